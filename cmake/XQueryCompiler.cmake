@@ -1,0 +1,22 @@
+# The compiler settings that every target of the project shares.
+
+set(CMAKE_CXX_STANDARD 20)
+set(CMAKE_CXX_STANDARD_REQUIRED ON)
+set(CMAKE_CXX_EXTENSIONS OFF)
+set(CMAKE_CXX_VISIBILITY_PRESET hidden)
+set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
+set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+
+# Objects carry their kind in a byte, so run-time type information would only add weight.
+add_compile_options($<$<COMPILE_LANGUAGE:CXX>:-fno-rtti>)
+
+if(XQUERY_SANITIZE)
+  # The check of virtual tables needs run-time type information.
+  add_compile_options(-fsanitize=${XQUERY_SANITIZE} -fno-sanitize-recover=all -fno-sanitize=vptr)
+  add_link_options(-fsanitize=${XQUERY_SANITIZE})
+endif()
+
+add_library(xquery_warnings INTERFACE)
+target_compile_options(xquery_warnings INTERFACE
+  -Wall -Wextra -Wpedantic -Wshadow -Wcast-qual -Wextra-semi -Wnon-virtual-dtor
+  -Wundef -Wunused -Wvla $<$<BOOL:${XQUERY_WERROR}>:-Werror>)

@@ -1,0 +1,13 @@
+# Third-party libraries, gathered behind one interface target. The packages that provide them on
+# Debian are listed in cmake/debian-packages.txt.
+
+find_package(PkgConfig REQUIRED)
+find_package(Threads REQUIRED)
+find_package(LibXml2 REQUIRED)
+find_package(ICU REQUIRED COMPONENTS uc i18n)
+pkg_check_modules(GMP REQUIRED IMPORTED_TARGET gmp)
+pkg_check_modules(URIPARSER REQUIRED IMPORTED_TARGET liburiparser)
+
+add_library(xquery_dependencies INTERFACE)
+target_link_libraries(xquery_dependencies INTERFACE
+  LibXml2::LibXml2 ICU::i18n ICU::uc PkgConfig::GMP PkgConfig::URIPARSER Threads::Threads)
