@@ -1,0 +1,89 @@
+// Failures. A host sees them as XQueryError objects; inside the engine a run-time failure travels
+// as an NSException, which never leaves the public interface.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+#include "xquery/Object.h"
+#include "xquery/String.h"
+
+namespace xquery {
+
+class XQUERY_EXPORT NSError : public NSCounted {
+ public:
+  static bool classof(const NSObject& object) {
+    return object.kind() == Kind::Error || object.kind() == Kind::QueryError;
+  }
+
+  // What the error carries beside its code; an absent entry is not in the dictionary.
+  struct UserInfo {
+    Ref<NSString> errorMessage;        // key "ErrorMessage"
+    std::optional<int64_t> errorLine;  // key "ErrorLine"
+  };
+
+  const Ref<NSString>& domain() const { return _domain; }
+  int64_t code() const { return _code; }
+  // Null when the error has neither message nor line.
+  const UserInfo* userInfo() const { return _userInfo ? &*_userInfo : nullptr; }
+  virtual Ref<NSString> localizedDescription() const;
+  virtual Ref<NSString> description() const { return localizedDescription(); }
+
+ protected:
+  NSError(Kind kind, Ref<NSString> domain, int64_t code, std::optional<UserInfo> userInfo);
+
+ private:
+  Ref<NSString> _domain;
+  int64_t _code;
+  std::optional<UserInfo> _userInfo;
+};
+
+// An error of the engine: domain "XQueryErrorDomain", the code is the error number. Lines count
+// from 1; 0 means that no line is known.
+class XQUERY_EXPORT XQueryError : public NSError {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::QueryError; }
+
+  // `line` counts from 0, as the scanner counts; the error stores line + 1.
+  [[nodiscard]] static Ref<XQueryError> error(int64_t number, const Ref<NSString>& withMsg,
+                                              int64_t atLine);
+  // Without a line.
+  [[nodiscard]] static Ref<XQueryError> error(int64_t number, const Ref<NSString>& withMsg);
+  // The same with the message as UTF-8 text.
+  [[nodiscard]] static Ref<XQueryError> error(int64_t number, std::string_view withMsg,
+                                              int64_t atLine);
+  [[nodiscard]] static Ref<XQueryError> error(int64_t number, std::string_view withMsg);
+
+  int64_t err() const { return _err; }
+  const Ref<NSString>& msg() const { return _msg; }
+  int64_t line() const { return _line; }
+
+  // XQueryError:3 - "message" at line:5
+  Ref<NSString> localizedDescription() const override;
+
+ protected:
+  XQueryError(int64_t number, Ref<NSString> msg, int64_t line);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  int64_t _err;
+  Ref<NSString> _msg;
+  int64_t _line;
+};
+
+// The one exception type of the engine.
+class XQUERY_EXPORT NSException {
+ public:
+  NSException(std::string name, Ref<NSString> reason)
+      : _name(std::move(name)), _reason(std::move(reason)) {}
+  const std::string& name() const { return _name; }
+  const Ref<NSString>& reason() const { return _reason; }
+
+ private:
+  std::string _name;
+  Ref<NSString> _reason;
+};
+
+}  // namespace xquery

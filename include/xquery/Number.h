@@ -1,0 +1,173 @@
+// Platform numbers.
+//
+// A decimal is an integer coefficient times a power of ten: a 64-bit coefficient inline in the
+// common case, arbitrary precision beyond it. Addition, subtraction and multiplication are exact; a
+// quotient that does not end is rounded half away from zero to 38 significant digits.
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+#include "xquery/Object.h"
+#include "xquery/String.h"
+
+namespace xquery {
+
+class XQUERY_EXPORT NSDecimal {
+ public:
+  NSDecimal() = default;
+  NSDecimal(int64_t value) : _coefficient(value) {}
+  static NSDecimal fromUnsigned(uint64_t value);
+  // The exact value of the shortest digits that read back to `value` (0 for NaN and infinities).
+  static NSDecimal fromDouble(double value);
+  static NSDecimal notANumber();
+  NSDecimal(const NSDecimal& other);
+  NSDecimal(NSDecimal&& other) noexcept;
+  NSDecimal& operator=(const NSDecimal& other);
+  NSDecimal& operator=(NSDecimal&& other) noexcept;
+  ~NSDecimal() { freeBig(); }
+
+  // Numeric scanning: skips leading white space, accepts a sign, digits, a fraction and an
+  // exponent, takes the longest prefix. False (and `out` untouched) when there is no number.
+  static bool scan(NSStringView text, NSDecimal& out);
+
+  bool isNaN() const { return _state == NaN; }
+  bool isZero() const { return _state == Small && _coefficient == 0; }
+  int sign() const;  // -1, 0, 1
+  bool isInteger() const;
+
+  NSDecimal add(const NSDecimal& other) const;
+  NSDecimal subtract(const NSDecimal& other) const;
+  NSDecimal multiply(const NSDecimal& other) const;
+  // The divisor must not be zero. Exact when the quotient ends, else 38 significant digits.
+  NSDecimal divide(const NSDecimal& divisor) const;
+  // Truncated quotient, and the remainder with the sign of the dividend. Divisor not zero.
+  NSDecimal integerDivide(const NSDecimal& divisor) const;
+  NSDecimal remainder(const NSDecimal& divisor) const;
+  NSDecimal negate() const;
+  NSDecimal truncated() const;  // toward zero
+  NSDecimal floor() const;
+  NSDecimal ceiling() const;
+  // Rounds to `scale` digits after the point (negative: before it), halves away from zero.
+  NSDecimal roundedPlain(int32_t scale) const;
+
+  // Exact; NaN equals NaN and is below every other value.
+  int compare(const NSDecimal& other) const;
+  uint32_t hash() const;  // agrees with the hash of an equal double
+
+  double doubleValue() const;
+  // Truncated; saturate outside the range.
+  int64_t int64Value() const;
+  uint64_t uint64Value() const;
+  // Whether the value is an integer within int64; the fast paths ask this.
+  bool isSmallInteger() const { return _state == Small && _scale == 0; }
+  int64_t smallInteger() const { return _coefficient; }
+
+  // Plain digits: no exponent, no trailing fractional zeros.
+  std::string toString() const;
+
+ private:
+  enum State : uint8_t { Small, Big, NaN };
+  struct BigInteger;  // arbitrary-precision coefficient
+  void freeBig();
+
+  union {
+    int64_t _coefficient = 0;
+    BigInteger* _big;
+  };
+  int32_t _scale = 0;  // value = coefficient * 10^-scale; normalised: no trailing zeros, >= 0
+  State _state = Small;
+  friend class NSDecimalArithmetic;
+};
+
+// A platform number. The two booleans are shared singletons and are the engine's xs:boolean values;
+// any other plain NSNumber is an xs:double as an item.
+class XQUERY_EXPORT NSNumber : public NSCounted {
+ public:
+  enum class Storage : uint8_t { Boolean, Int64, UInt64, Double, Float, Decimal };
+
+  static bool classof(const NSObject& object) {
+    return object.kind() >= Kind::Number && object.kind() <= Kind::TypedNumber;
+  }
+
+  // The shared truth values; compared by identity.
+  static NSNumber* trueValue();
+  static NSNumber* falseValue();
+  [[nodiscard]] static Ref<NSNumber> numberWithBool(bool value) {
+    return value ? trueValue() : falseValue();
+  }
+  [[nodiscard]] static Ref<NSNumber> numberWithLongLong(int64_t value);
+  [[nodiscard]] static Ref<NSNumber> numberWithUnsignedLongLong(uint64_t value);
+  [[nodiscard]] static Ref<NSNumber> numberWithDouble(double value);
+  [[nodiscard]] static Ref<NSNumber> numberWithFloat(float value);
+
+  Storage storage() const { return static_cast<Storage>(_flags); }
+  bool isBoolean() const { return storage() == Storage::Boolean; }
+
+  bool boolValue() const;
+  double doubleValue() const;
+  float floatValue() const;
+  // Truncate and saturate; NaN gives 0.
+  int64_t longLongValue() const;
+  uint64_t unsignedLongLongValue() const;
+  // As an index: a negative value or NaN is huge and selects nothing.
+  uint64_t unsignedIntegerValue() const;
+  int64_t integerValue() const { return longLongValue(); }
+  // Exact for integers and decimals; a double's shortest digits; NaN gives not-a-number.
+  NSDecimal decimalValue() const;
+
+  // -1, 0 or 1. Exact between integers and decimals, by double otherwise; NaN equals NaN and is
+  // below every other number.
+  int compare(const NSNumber& other) const;
+  // Numeric equality; booleans count as 0 and 1. `hash` agrees with it.
+  bool isEqualToNumber(const NSNumber& other) const { return compare(other) == 0; }
+  uint32_t hash() const;
+
+  // "true"/"false"; decimals plain; a double's shortest digits, plain for decimal exponents from
+  // -4 to 16, otherwise with an exponent ("1e+17"); "NaN", "INF", "-INF".
+  std::string stringValue() const;
+
+ protected:
+  NSNumber(Kind kind, uint16_t aux, bool value);
+  NSNumber(Kind kind, uint16_t aux, int64_t value);
+  NSNumber(Kind kind, uint16_t aux, uint64_t value);
+  NSNumber(Kind kind, uint16_t aux, double value);
+  NSNumber(Kind kind, uint16_t aux, float value);
+  NSNumber(Kind kind, uint16_t aux, NSDecimal value);
+  // Takes the payload of another number.
+  NSNumber(Kind kind, uint16_t aux, const NSNumber& value);
+  ~NSNumber() override;
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+  union {
+    bool _bool;
+    int64_t _int64;
+    uint64_t _uint64;
+    double _double;
+    float _float;
+    NSDecimal _decimal;
+  };
+};
+
+class XQUERY_EXPORT NSDecimalNumber : public NSNumber {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::DecimalNumber; }
+  // Longest numeric prefix; not-a-number when there is none.
+  [[nodiscard]] static Ref<NSDecimalNumber> decimalNumberWithString(NSStringView text);
+  [[nodiscard]] static Ref<NSDecimalNumber> decimalNumberWithDecimal(NSDecimal value);
+
+ protected:
+  explicit NSDecimalNumber(NSDecimal value);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+};
+
+// Scans a double by the same rule as NSDecimal::scan. "inf", "nan" and hexadecimal forms are not
+// numbers; what overflows becomes an infinity.
+XQUERY_EXPORT bool scanDouble(NSStringView text, double& out);
+// The printing rule of `stringValue` for a finite double or float.
+XQUERY_EXPORT std::string formatDouble(double value);
+XQUERY_EXPORT std::string formatFloat(float value);
+
+}  // namespace xquery

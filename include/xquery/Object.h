@@ -1,0 +1,285 @@
+// The base of every object a query can see or a host can hold.
+//
+//   NSObject          8 bytes: a word, a kind byte, a flag byte and 16 spare bits; no virtual table
+//    |- NSXMLNode     lives in the arena of its tree; the word is its document-order number
+//    `- NSCounted     on the heap, reference counted (the word is the count), virtual destructor
+//
+// A reference to a node keeps the node's whole tree alive by one counter on the tree, so holding a
+// node never writes to it. Counted objects carry their own count, a plain increment while the
+// process has one thread and an atomic one afterwards. Shared singletons are immortal: the top bit
+// of their count is set and the count is never touched.
+//
+// A query value (`Value`) has one of four shapes:
+//   null reference   only after an error has been recorded
+//   the NSNull       the empty sequence
+//   one item         a node or an atomic value
+//   an NSArray       a sequence of its elements
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <type_traits>
+#include <utility>
+
+#include <sys/single_threaded.h>
+
+#include "xquery/Export.h"
+
+namespace xquery {
+
+// The closed set of classes. Node kinds have the numbers of the tree's node kinds. A class whose
+// instances may also be of a subclass tests a range or list of kinds in its `classof`.
+enum class Kind : uint8_t {
+  None = 0,
+  Document = 1,
+  Element = 2,
+  Attribute = 3,
+  Namespace = 4,
+  ProcessingInstruction = 5,
+  Comment = 6,
+  Text = 7,  // last node kind
+
+  Null = 16,
+  Array,
+  Sequence,  // XQuerySequence
+  String,
+  TypedString,  // XQueryString
+  Number,
+  DecimalNumber,
+  TypedNumber,  // XQueryNumber
+  URL,
+  Data,
+  Date,
+  Duration,
+  QName,
+  Notation,
+  HexBinary,
+  Base64Binary,
+  Error,
+  QueryError,  // XQueryError
+  ElementContentString,
+  Query,
+  Context,
+
+  // Objects that never are items. The engine tells its own classes apart by these.
+  Internal = 64,
+  Prolog,
+  Modules,
+  PrologItem,
+  FunctionDecl,
+  VarDecl,
+  Param,
+  ParsedModule,
+  PathResults,
+  PathStepFirst,
+  AxisStep = PathStepFirst,
+  FilterStep,
+  RootStep,
+  PathStepLast = RootStep,
+  ExprFirst = 128,
+  ExprList = ExprFirst,
+  Args,
+  Literal,
+  Variable,
+  ContextItemExpr,
+  QNameReference,
+  PathExpr,
+  RootStepExpr,
+  NameTest,
+  WildCardNameTest,
+  OperatorExpr,
+  TypeDeclaration,
+  OtherExpr,
+  ExprLast = 255,
+};
+
+constexpr bool isNodeKind(Kind kind) { return kind >= Kind::Document && kind <= Kind::Text; }
+
+class NSObject {
+ public:
+  NSObject(const NSObject&) = delete;
+  NSObject& operator=(const NSObject&) = delete;
+
+  Kind kind() const { return _kind; }
+  bool isNode() const { return isNodeKind(_kind); }
+
+ protected:
+  explicit NSObject(Kind kind) : _kind(kind) {}
+  ~NSObject() = default;
+
+  mutable uint32_t _word = 0;
+  Kind _kind;
+  uint8_t _flags = 0;
+  uint16_t _aux = 0;
+};
+
+// A heap object with a reference count. Created with a count of 0; the first `Ref` makes it 1.
+class XQUERY_EXPORT NSCounted : public NSObject {
+ public:
+  static bool classof(const NSObject& object) { return !object.isNode(); }
+
+  void retain() const {
+    const uint32_t count = __atomic_load_n(&_word, __ATOMIC_RELAXED);
+    if (count & immortalBit) return;
+    if (__libc_single_threaded) {
+      _word = count + 1;
+    } else {
+      __atomic_fetch_add(&_word, 1U, __ATOMIC_RELAXED);
+    }
+  }
+
+  void release() const {
+    const uint32_t count = __atomic_load_n(&_word, __ATOMIC_RELAXED);
+    if (count & immortalBit) return;
+    if (__libc_single_threaded) {
+      if ((_word = count - 1) == 0) destroy(this);
+    } else if (__atomic_fetch_sub(&_word, 1U, __ATOMIC_ACQ_REL) == 1) {
+      destroy(this);
+    }
+  }
+
+  // For shared singletons: from now on the object is never freed.
+  void makeImmortal() const { _word |= immortalBit; }
+  bool isImmortal() const { return (_word & immortalBit) != 0; }
+  bool hasOneReference() const { return _word == 1; }
+
+  // Blocks up to 128 bytes come from per-thread free lists.
+  static void* operator new(size_t size);
+  static void operator delete(void* block, size_t size) noexcept;
+
+ protected:
+  explicit NSCounted(Kind kind) : NSObject(kind) {}
+  virtual ~NSCounted() = default;
+
+ private:
+  static constexpr uint32_t immortalBit = 0x80000000U;
+
+  // Destruction never recurses deeply: past a fixed depth objects queue up and are destroyed in
+  // turn, so that a chain of a million objects costs no stack.
+  static void destroy(const NSCounted* object);
+};
+
+class NSXMLNode;
+XQUERY_EXPORT void retainTreeOf(const NSXMLNode* node);
+XQUERY_EXPORT void releaseTreeOf(const NSXMLNode* node);
+
+// Kind tests: isa<T>(object), cast<T>(object) (the caller knows), dyn_cast<T>(object) (null when it
+// is another class). All accept null; isa answers false for it.
+template <class T>
+bool isa(const NSObject* object) {
+  return object && T::classof(*object);
+}
+template <class T>
+T* cast(NSObject* object) {
+  return static_cast<T*>(object);
+}
+template <class T>
+const T* cast(const NSObject* object) {
+  return static_cast<const T*>(object);
+}
+template <class T>
+T* dyn_cast(NSObject* object) {
+  return isa<T>(object) ? static_cast<T*>(object) : nullptr;
+}
+template <class T>
+const T* dyn_cast(const NSObject* object) {
+  return isa<T>(object) ? static_cast<const T*>(object) : nullptr;
+}
+
+// A counted reference to an object of class T; may be null.
+template <class T>
+class Ref {
+ public:
+  Ref() = default;
+  Ref(std::nullptr_t) {}
+  Ref(T* object) : _object(object) { retain(); }
+  Ref(const Ref& other) : _object(other._object) { retain(); }
+  Ref(Ref&& other) noexcept : _object(std::exchange(other._object, nullptr)) {}
+  template <class U, class = std::enable_if_t<std::is_convertible_v<U*, T*>>>
+  Ref(const Ref<U>& other) : _object(other.get()) {
+    retain();
+  }
+  template <class U, class = std::enable_if_t<std::is_convertible_v<U*, T*>>>
+  Ref(Ref<U>&& other) noexcept : _object(other.detach()) {}
+  ~Ref() { release(); }
+
+  Ref& operator=(const Ref& other) {
+    Ref(other).swap(*this);
+    return *this;
+  }
+  Ref& operator=(Ref&& other) noexcept {
+    Ref(std::move(other)).swap(*this);
+    return *this;
+  }
+  void swap(Ref& other) noexcept { std::swap(_object, other._object); }
+
+  T* get() const { return _object; }
+  T* operator->() const { return _object; }
+  T& operator*() const { return *_object; }
+  explicit operator bool() const { return _object != nullptr; }
+
+  // Gives up the reference without releasing it.
+  T* detach() noexcept { return std::exchange(_object, nullptr); }
+
+  friend bool operator==(const Ref& a, const Ref& b) { return a._object == b._object; }
+  friend bool operator==(const Ref& a, const T* b) { return a._object == b; }
+
+ private:
+  void retain() const {
+    if (_object) retainObject(_object);
+  }
+  void release() const {
+    if (_object) releaseObject(_object);
+  }
+  static void retainObject(const T* object) {
+    if constexpr (std::is_base_of_v<NSCounted, T>) {
+      object->retain();
+    } else if constexpr (std::is_same_v<NSObject, std::remove_const_t<T>>) {
+      if (object->isNode()) {
+        retainTreeOf(reinterpret_cast<const NSXMLNode*>(object));
+      } else {
+        static_cast<const NSCounted*>(object)->retain();
+      }
+    } else {
+      retainTreeOf(object);
+    }
+  }
+  static void releaseObject(const T* object) {
+    if constexpr (std::is_base_of_v<NSCounted, T>) {
+      object->release();
+    } else if constexpr (std::is_same_v<NSObject, std::remove_const_t<T>>) {
+      if (object->isNode()) {
+        releaseTreeOf(reinterpret_cast<const NSXMLNode*>(object));
+      } else {
+        static_cast<const NSCounted*>(object)->release();
+      }
+    } else {
+      releaseTreeOf(object);
+    }
+  }
+
+  T* _object = nullptr;
+};
+
+// Makes a counted object: make<NSArray>(...).
+template <class T, class... Arguments>
+[[nodiscard]] Ref<T> make(Arguments&&... arguments) {
+  return Ref<T>(new T(std::forward<Arguments>(arguments)...));
+}
+
+template <class T>
+bool isa(const Ref<NSObject>& value) {
+  return isa<T>(static_cast<const NSObject*>(value.get()));
+}
+template <class T>
+T* cast(const Ref<NSObject>& value) {
+  return static_cast<T*>(value.get());
+}
+template <class T>
+T* dyn_cast(const Ref<NSObject>& value) {
+  return dyn_cast<T>(value.get());
+}
+
+using Value = Ref<NSObject>;
+
+}  // namespace xquery

@@ -1,0 +1,34 @@
+// URI references of RFC 3986.
+#pragma once
+
+#include "xquery/Object.h"
+#include "xquery/String.h"
+
+namespace xquery {
+
+// As an item an xs:anyURI value.
+class XQUERY_EXPORT NSURL : public NSCounted {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::URL; }
+
+  // Absolute or relative, the empty text included. Null when the text holds a character or a form
+  // that RFC 3986 does not allow.
+  [[nodiscard]] static Ref<NSURL> URLWithString(const Ref<NSString>& text);
+  // RFC 3986 section 5 resolution against an absolute base. Null when either does not parse.
+  [[nodiscard]] static Ref<NSURL> URLWithString(const Ref<NSString>& text, const NSURL& base);
+
+  // The text as given (for a resolved reference: the resolved text).
+  const Ref<NSString>& absoluteString() const { return _text; }
+  bool isEqual(const NSURL& other) const { return _text->isEqualToString(*other._text); }
+  uint32_t hash() const { return _text->hash(); }
+
+ protected:
+  explicit NSURL(Ref<NSString> text) : NSCounted(Kind::URL), _text(std::move(text)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<NSString> _text;
+};
+
+}  // namespace xquery

@@ -1,0 +1,12 @@
+// Everything a host program needs.
+#pragma once
+
+#include "xquery/Collection.h"
+#include "xquery/Data.h"
+#include "xquery/Error.h"
+#include "xquery/Number.h"
+#include "xquery/Object.h"
+#include "xquery/String.h"
+#include "xquery/URL.h"
+#include "xquery/XMLNode.h"
+#include "xquery/XQuery.h"

@@ -1,0 +1,110 @@
+// The dynamic context: variables, globals, focus, in-scope namespaces, the active prolog, the last
+// error and what is kept from one evaluation to the next.
+#pragma once
+
+#include <map>
+#include <memory>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+#include "Types/XQueryQName.h"
+#include "xquery/Error.h"
+#include "xquery/Object.h"
+#include "xquery/XMLNode.h"
+#include "xquery/XQuery.h"
+
+namespace xquery {
+
+class XQueryProlog;
+
+// One frame of local variables, indexed by local variable ID; index 0 is never used.
+using XQueryFrame = std::vector<Value>;
+using XQueryFrameRef = std::shared_ptr<XQueryFrame>;
+
+class XQueryContextInternal {
+ public:
+  explicit XQueryContextInternal(XQueryContext& owner);
+  ~XQueryContextInternal();
+
+  // --- variables -------------------------------------------------------------------------------
+  // Null for an ID below 1 or past the end; a slot that was never set holds NSNull.
+  NSObject* variableForID(int64_t varID) const;
+  // ID 0 is ignored.
+  void setVariable(const Value& value, int64_t forID);
+  XQueryFrameRef _inScopeVariables() const { return _variables; }
+  void _setInScopeVariables(XQueryFrameRef variables) { _variables = std::move(variables); }
+  NSObject* globalForQName(const XQueryQName& qName) const;
+  void setGlobal(const Value& value, const Ref<XQueryQName>& forQName);
+  void _clearGlobals();
+
+  // --- static questions, answered by the active prolog ------------------------------------------
+  XQueryProlog* activeProlog() const { return _prolog; }
+  void setActiveProlog(XQueryProlog* prolog) { _prolog = prolog; }
+  Ref<NSString> namespaceForPrefix(NSStringView prefix) const;
+  Ref<NSString> namespaceForPrefix(NSStringView prefix, bool& fromProlog) const;
+  Ref<NSString> defaultElementNamespace() const;
+  Ref<NSString> defaultCollation() const;
+  Ref<NSString> baseURI() const;
+  bool xmlSpacePreserve() const;
+
+  // --- focus -----------------------------------------------------------------------------------
+  const Value& contextItem() const { return _contextItem; }
+  int64_t position() const { return _position; }
+  int64_t last() const { return _last; }
+  void setContextItem(Value item, int64_t position) {
+    _contextItem = std::move(item);
+    _position = position;
+  }
+  void setLast(int64_t last) { _last = last; }
+
+  bool ordered() const { return _ordered; }
+  void setOrdered(bool ordered) { _ordered = ordered; }
+
+  // --- namespaces ------------------------------------------------------------------------------
+  void pushInScopeNamespaces(std::vector<Ref<NSXMLNode>> namespaces);
+  void popInScopeNamespaces();
+  // The innermost constructor's prefix for the URI, else the last of the active prolog's prefixes;
+  // null when there is none.
+  Ref<NSString> firstPrefixForNamespace(NSStringView URI) const;
+  Ref<NSString> contextNamespaceForPrefix(NSStringView prefix) const;
+  // A null URI removes the prefix.
+  void addNamespace(const Ref<NSString>& URI, const Ref<NSString>& forPrefix);
+
+  // --- base URIs of constructed nodes ------------------------------------------------------------
+  // Does nothing when either is null.
+  void setBaseURI(const Ref<NSString>& URI, NSXMLNode* forNode);
+  Ref<NSString> baseURIForNode(const NSXMLNode* node) const;
+  size_t baseURINodeCount() const { return _baseURINodes.size(); }
+
+  // --- errors ----------------------------------------------------------------------------------
+  const Ref<XQueryError>& error() const { return _error; }
+  // Keeps the error (the last one wins) and, when asked, throws an NSException named "XQueryError"
+  // whose reason is the error's description.
+  void setError(Ref<XQueryError> error, bool raiseException);
+  // For code that always raises.
+  [[noreturn]] void raise(Ref<XQueryError> error);
+
+  std::shared_ptr<XQueryClient> client() const { return _client; }
+  void setClient(std::shared_ptr<XQueryClient> client) { _client = std::move(client); }
+
+  // Always null: external functions cannot be bound.
+  Value XQueryExternalFunctionForQName(const XQueryQName& qName) const;
+
+ private:
+  XQueryContext& _owner;
+  XQueryFrameRef _variables;
+  std::vector<std::vector<Ref<NSXMLNode>>> _inScopeNamespaces;
+  std::unordered_map<const NSXMLNode*, Ref<NSString>> _baseURINodes;
+  std::unordered_map<Ref<XQueryQName>, Value, XQueryQNameHash, XQueryQNameEqual> _globals;
+  std::map<std::string, Ref<NSString>> _contextNamespaces;
+  Ref<XQueryError> _error;
+  XQueryProlog* _prolog = nullptr;
+  std::shared_ptr<XQueryClient> _client;
+  Value _contextItem;
+  int64_t _position = 0;
+  int64_t _last = 0;
+  bool _ordered = true;
+};
+
+}  // namespace xquery

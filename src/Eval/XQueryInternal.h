@@ -1,0 +1,35 @@
+// A compiled query: prolog, body and the errors found while compiling.
+#pragma once
+
+#include <vector>
+
+#include "Expr/XQueryExpr.h"
+#include "xquery/Error.h"
+#include "xquery/String.h"
+
+namespace xquery {
+
+class XQueryProlog;
+
+class XQueryInternal {
+ public:
+  // Compiles. Parse errors leave prolog and body null.
+  explicit XQueryInternal(const Ref<NSString>& initWithSource);
+  // A query that failed before it could be parsed.
+  explicit XQueryInternal(Ref<XQueryError> error);
+  // A query put together by hand, for the tests of the expression tree.
+  XQueryInternal(Ref<XQueryProlog> prolog, Ref<XQueryExpr> body);
+  ~XQueryInternal();
+
+  XQueryProlog* prolog() const;
+  XQueryExpr* body() const;
+  const std::vector<Ref<XQueryError>>& errors() const { return _errors; }
+  bool isError() const { return !_errors.empty(); }
+
+ private:
+  Ref<XQueryProlog> _prolog;
+  Ref<XQueryExpr> _body;
+  std::vector<Ref<XQueryError>> _errors;
+};
+
+}  // namespace xquery

@@ -1,0 +1,65 @@
+// The result container and the rules about value shapes that every consumer shares.
+#pragma once
+
+#include "xquery/Collection.h"
+#include "xquery/Object.h"
+
+namespace xquery {
+
+// A flat sequence: adding an array adds its items, adding the empty sequence adds nothing. So its
+// elements are never arrays and never NSNull.
+class XQuerySequence : public NSArray {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::Sequence; }
+
+  [[nodiscard]] static Ref<XQuerySequence> sequence() { return make<XQuerySequence>(); }
+  [[nodiscard]] static Ref<XQuerySequence> sequenceWithItem(const Value& item);
+
+  void addObject(const Value& item);
+  // Ignores null and NSNull and does not flatten; into an empty sequence the index is not looked
+  // at, past the end it appends.
+  void insertObject(const Value& item, size_t atIndex);
+  void removeLastObject();
+  void removeObjectAtIndex(size_t index);
+  void replaceObjectAtIndex(size_t index, const Value& withObject);
+
+ protected:
+  XQuerySequence() : NSArray(Kind::Sequence) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+};
+
+inline bool isNull(const Value& value) { return value && value->kind() == Kind::Null; }
+
+// A one-element array becomes its element and an empty array NSNull; anything else is unchanged.
+Value normalised(Value value);
+
+// Gathers values as the comma operator does: nothing gives NSNull, the first non-empty value is
+// kept as it is, a second one turns both into a sequence. `value` normalises.
+class XQueryGatherer {
+ public:
+  void add(Value value);
+  Value value();
+
+ private:
+  Value _first;
+  Ref<XQuerySequence> _sequence;
+};
+
+// The item-list rule: null, NSNull and an empty array are no items, an array its elements, anything
+// else one item. The value must outlive the list.
+class XQueryItemList {
+ public:
+  explicit XQueryItemList(const NSObject* value);
+  size_t count() const { return _count; }
+  NSObject* operator[](size_t index) const {
+    return _array ? _array->objectAtIndex(index) : _single;
+  }
+
+ private:
+  const NSArray* _array = nullptr;
+  NSObject* _single = nullptr;
+  size_t _count = 0;
+};
+
+}  // namespace xquery

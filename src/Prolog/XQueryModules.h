@@ -1,0 +1,57 @@
+// Namespace IDs of one compilation, and the library modules it loaded.
+#pragma once
+
+#include <cstdint>
+#include <unordered_map>
+#include <vector>
+
+#include "xquery/Object.h"
+#include "xquery/String.h"
+
+namespace xquery {
+
+class XQueryProlog;
+
+enum XQueryNamespaceID : int64_t {
+  XQueryNamespaceNone = 0,
+  XQueryNamespaceCodepointCollation = 1,
+  XQueryNamespaceLocal = 2,
+  XQueryNamespaceXML = 3,
+  XQueryNamespaceXmlns = 4,
+  XQueryNamespaceXS = 5,
+  XQueryNamespaceXSI = 6,
+  XQueryNamespaceFN = 7,
+  XQueryNamespaceXDT = 8,
+  XQueryNamespaceErr = 9,
+  XQueryNamespaceExt = 10,
+  XQueryNamespaceXHTML = 11,
+  XQueryNamespaceFirstUser = 12,
+};
+
+class XQueryModules : public NSCounted {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::Modules; }
+  [[nodiscard]] static Ref<XQueryModules> modules();
+
+  // The built-in URI for IDs 1 to 11, else null.
+  static Ref<NSString> builtinNamespaceForID(int64_t id);
+  // Null for ID 0, past the end, and for an empty URI.
+  Ref<NSString> namespaceForID(int64_t id) const;
+  // 0 for an unknown URI that may not be created. The first new one gets 12.
+  int64_t namespaceID(const Ref<NSString>& URI, bool canCreate);
+  XQueryProlog* prologForID(int64_t id) const;
+  void addProlog(Ref<XQueryProlog> prolog, int64_t forID);
+
+ protected:
+  XQueryModules();
+  ~XQueryModules() override;
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  std::vector<Ref<NSString>> _namespaces;
+  std::unordered_map<std::string, int64_t> _namespaceIDs;
+  std::vector<Ref<XQueryProlog>> _prologs;
+};
+
+}  // namespace xquery

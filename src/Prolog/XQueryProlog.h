@@ -1,0 +1,174 @@
+// The static context of one module.
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+#include "Types/XQueryQName.h"
+#include "xquery/Collection.h"
+#include "xquery/Error.h"
+#include "xquery/Object.h"
+#include "xquery/String.h"
+#include "xquery/XMLNode.h"
+
+namespace xquery {
+
+class XQueryFunctionDecl;
+class XQueryModules;
+class XQueryPrologItem;
+class XQueryPrologItemModuleImport;
+class XQueryPrologItemSchemaImport;
+class XQueryQNameReference;
+class XQueryVarDecl;
+
+// A function name together with its number of parameters.
+class XQueryFunctionSignature {
+ public:
+  XQueryFunctionSignature(Ref<XQueryQName> name, size_t argCount)
+      : _name(std::move(name)), _argCount(argCount) {}
+  const Ref<XQueryQName>& name() const { return _name; }
+  size_t argCount() const { return _argCount; }
+  bool operator==(const XQueryFunctionSignature& other) const {
+    return _argCount == other._argCount && _name->isEqual(*other._name);
+  }
+  // The name's hash: overloads of one name share a bucket.
+  uint32_t hash() const { return _name->hash(); }
+
+ private:
+  Ref<XQueryQName> _name;
+  size_t _argCount;
+};
+struct XQueryFunctionSignatureHash {
+  size_t operator()(const XQueryFunctionSignature& signature) const { return signature.hash(); }
+};
+
+class XQueryProlog : public NSCounted {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::Prolog; }
+
+  // `modules` null makes a new registry; `location` and `version` may be null.
+  [[nodiscard]] static Ref<XQueryProlog> prologWithItems(
+      const std::vector<Ref<XQueryPrologItem>>& items, Ref<NSString> atLocation,
+      Ref<XQueryModules> forModules, const Ref<NSString>& version);
+
+  XQueryModules& modules() const { return *_modules; }
+  bool xmlSpacePreserve() const { return _xmlSpacePreserve; }
+  bool constructionPreserve() const { return _constructionPreserve; }
+  bool ordered() const { return _ordered; }
+  bool emptyLeast() const { return _emptyLeast; }
+  bool inheritNamespaces() const { return _inheritNamespaces; }
+  // Null when undeclared.
+  const Ref<NSString>& defaultElementNamespace() const { return _defaultElementNamespace; }
+  const Ref<NSString>& defaultCollation() const { return _defaultCollation; }
+  const Ref<NSString>& baseURI() const { return _baseURI; }
+  const Ref<NSString>& modulePrefix() const { return _modulePrefix; }
+  const Ref<NSString>& location() const { return _location; }
+  // The declared one, else the standard function namespace.
+  Ref<NSString> defaultFunctionNamespace() const;
+  int schemaMode() const { return _schemaMode; }
+  bool isModule() const { return static_cast<bool>(_modulePrefix); }
+  // XQueryVarDecl and XQueryFunctionDecl objects in the order they were registered.
+  const std::vector<Value>& declarations() const { return _declarations; }
+  const std::vector<Ref<XQueryError>>& errors() const { return _errors; }
+  const std::vector<Ref<XQueryQNameReference>>& qNameReferences() const { return _qNameReferences; }
+  const std::vector<Ref<XQueryPrologItemModuleImport>>& moduleImports() const;
+  const std::vector<Ref<XQueryPrologItemSchemaImport>>& schemaImports() const;
+
+  // --- namespaces ------------------------------------------------------------------------------
+  // The in-scope namespaces first (`fromProlog` false), then the declared prefixes. Null for an
+  // unknown prefix.
+  Ref<NSString> namespaceForPrefix(NSStringView prefix, bool& fromProlog) const;
+  Ref<NSString> namespaceForPrefix(NSStringView prefix) const;
+  Ref<NSString> namespaceForID(int64_t id) const;
+  int64_t namespaceID(const Ref<NSString>& URI) const;
+  int64_t namespaceIDForPrefix(NSStringView prefix) const;
+  // Null, one string, or an array of strings.
+  Value prefixesForID(int64_t id) const;
+  int64_t addNamespace(const Ref<NSString>& URI);
+  void addPrefix(const Ref<NSString>& prefix, const Ref<NSString>& forNamespace);
+  void addNamespace(const Ref<NSString>& URI, const Ref<NSString>& forPrefix) {
+    addPrefix(forPrefix, URI);
+  }
+  void pushInScopeNamespaces(std::vector<Ref<NSXMLNode>> namespaces);
+  void popInScopeNamespaces();
+
+  // --- declarations and names ------------------------------------------------------------------
+  XQueryVarDecl* variableInfoForQName(const Ref<XQueryQName>& qName) const;
+  void setVariableInfo(Ref<XQueryVarDecl> declaration, const Ref<XQueryQName>& forQName);
+  XQueryFunctionDecl* functionInfoForSignature(const XQueryFunctionSignature& signature) const;
+  void setFunctionInfo(Ref<XQueryFunctionDecl> declaration,
+                       const XQueryFunctionSignature& forSignature);
+  // 0 when no local variable of that name is in scope.
+  int64_t localVariableIDForQName(const Ref<XQueryQName>& qName) const;
+  int64_t newLocalVariableIDForQName(const Ref<XQueryQName>& qName);
+  int64_t nextLocalVariableID() const { return _nextLocalVariableID; }
+  void setNextLocalVariableID(int64_t id) { _nextLocalVariableID = id; }
+  // Null when the name does not resolve.
+  Ref<XQueryQName> variableQNameFromString(const Ref<NSString>& name) const;
+  Ref<XQueryQName> functionQNameFromString(const Ref<NSString>& name) const;
+  Ref<XQueryQName> xmlQNameFromString(const Ref<NSString>& name) const;
+  void addQNameReference(Ref<XQueryQNameReference> reference);
+  void addError(Ref<XQueryError> error);
+
+  // --- setters, used by the prolog items ---------------------------------------------------------
+  void setModulePrefix(Ref<NSString> prefix) { _modulePrefix = std::move(prefix); }
+  void setBaseURI(Ref<NSString> baseURI) { _baseURI = std::move(baseURI); }
+  void setXMLSpacePreserve(bool preserve) { _xmlSpacePreserve = preserve; }
+  void setConstructionPreserve(bool preserve) { _constructionPreserve = preserve; }
+  void setOrdered(bool ordered) { _ordered = ordered; }
+  void setEmptyLeast(bool least) { _emptyLeast = least; }
+  void setInheritNamespaces(bool inherit) { _inheritNamespaces = inherit; }
+  void setDefaultCollation(Ref<NSString> collation) { _defaultCollation = std::move(collation); }
+  void setDefaultElementNamespace(Ref<NSString> URI);
+  void setDefaultFunctionNamespace(Ref<NSString> URI);
+  void setSchemaMode(int mode) { _schemaMode = mode; }
+  void addModule(Ref<XQueryPrologItemModuleImport> item);
+  void addSchema(Ref<XQueryPrologItemSchemaImport> item);
+  // Accepts its arguments and does nothing: no schema is ever loaded.
+  void setDefaultSchema(const Ref<NSString>& URI, const Ref<NSString>& atLocation);
+
+  Ref<NSString> description() const;
+
+  XQueryProlog();
+
+ protected:
+  ~XQueryProlog() override;
+
+ private:
+  void _addItems(const std::vector<Ref<XQueryPrologItem>>& items);
+  void _resolveImports();
+  void _bindInfo();
+
+  Ref<XQueryModules> _modules;
+  Ref<NSString> _modulePrefix;
+  Ref<NSString> _defaultCollation;
+  Ref<NSString> _defaultElementNamespace;
+  Ref<NSString> _defaultFunctionNamespace;
+  Ref<NSString> _baseURI;
+  Ref<NSString> _location;
+  int _schemaMode = 0;
+  std::vector<Ref<XQueryError>> _errors;
+  std::vector<Ref<XQueryPrologItemModuleImport>> _moduleImports;
+  std::vector<Ref<XQueryPrologItemSchemaImport>> _schemaImports;
+  std::vector<Value> _namespacePrefixes;  // by ID: NSNull, a string, or an array of strings
+  std::unordered_map<std::string, int64_t> _namespacePrefixIDs;
+  std::vector<Value> _declarations;
+  std::vector<Ref<XQueryQNameReference>> _qNameReferences;
+  std::unordered_map<Ref<XQueryQName>, Ref<XQueryVarDecl>, XQueryQNameHash, XQueryQNameEqual>
+      _variables;
+  std::unordered_map<XQueryFunctionSignature, Ref<XQueryFunctionDecl>, XQueryFunctionSignatureHash>
+      _functions;
+  int64_t _nextLocalVariableID = 1;
+  std::unordered_map<Ref<XQueryQName>, int64_t, XQueryQNameHash, XQueryQNameEqual>
+      _localVariableIDs;
+  std::vector<std::vector<Ref<NSXMLNode>>> _inScopeNamespaces;
+  bool _xmlSpacePreserve = false;
+  bool _constructionPreserve = true;
+  bool _ordered = true;
+  bool _emptyLeast = true;
+  bool _inheritNamespaces = true;
+};
+
+}  // namespace xquery

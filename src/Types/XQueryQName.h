@@ -1,0 +1,70 @@
+// Expanded names as values.
+#pragma once
+
+#include <functional>
+
+#include "xquery/Object.h"
+#include "xquery/String.h"
+#include "xquery/XMLNode.h"
+
+namespace xquery {
+
+class XQueryQName : public NSCounted {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::QName; }
+
+  // A range in a lexical name; location notFound when there is none.
+  struct Range {
+    uint32_t location;
+    uint32_t length;
+  };
+  static constexpr uint32_t notFound = NSStringView::notFound;
+
+  // Splits the lexical name and keeps the prefix as a hint for printing. `namespaceURI` is null
+  // for no namespace.
+  [[nodiscard]] static Ref<XQueryQName> qname(const Ref<NSString>& name,
+                                              const Ref<NSString>& forNamespace);
+  // Without a hint.
+  [[nodiscard]] static Ref<XQueryQName> qnameWithLocalPart(const Ref<NSString>& localPart,
+                                                           const Ref<NSString>& forNamespace);
+
+  static void parseQNameString(const Ref<NSString>& name, Ref<NSString>& toPrefix,
+                               Ref<NSString>& localPart);
+  static void parseQNameString(NSStringView name, Range& prefixRange, Range& localPartRange);
+
+  const Ref<NSString>& namespaceURI() const { return _namespaceURI; }
+  const Ref<NSString>& localPart() const { return _localPart; }
+  const Ref<NSString>& prefixHint() const { return _prefixHint; }
+  // Namespace and local part; the hint plays no part.
+  bool isEqual(const XQueryQName& other) const;
+  uint32_t hash() const { return _localPart->hash(); }
+  // prefix:local, or the local part without a hint.
+  Ref<NSString> XQueryStringValue() const;
+  Ref<NSString> description() const;
+
+  // The interned name that nodes of this name carry; made on first use by the binding pass.
+  const NSXMLExpandedNameRef& expandedName() const { return _expandedName; }
+
+ protected:
+  XQueryQName(Ref<NSString> namespaceURI, Ref<NSString> localPart, Ref<NSString> prefixHint);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<NSString> _namespaceURI;
+  Ref<NSString> _localPart;
+  Ref<NSString> _prefixHint;
+  NSXMLExpandedNameRef _expandedName;
+};
+
+// For tables keyed by QName.
+struct XQueryQNameHash {
+  size_t operator()(const Ref<XQueryQName>& name) const { return name->hash(); }
+};
+struct XQueryQNameEqual {
+  bool operator()(const Ref<XQueryQName>& a, const Ref<XQueryQName>& b) const {
+    return a->isEqual(*b);
+  }
+};
+
+}  // namespace xquery
