@@ -1,0 +1,197 @@
+// xquery_bench [--factor=F] [--scaling] [Google Benchmark options]
+//
+// Measures the tree build and a table of paths over auction data, each beside the peer's figure
+// from the same run. The factor may also come from XQUERY_BENCH_FACTOR; 0.1 (about 11 MB) is the
+// default. Before a path is measured, both sides must agree on the number of nodes it selects.
+#include "AuctionData.h"
+#include "Engine.h"
+#include "Peer.h"
+#include "Scaling.h"
+
+#include <benchmark/benchmark.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <malloc.h>
+#include <memory>
+#include <optional>
+#include <string>
+#include <unistd.h>
+#include <vector>
+
+namespace {
+
+using namespace xquery;
+
+struct Inputs {
+  std::string xml;
+  Ref<NSXMLDocument> document;
+  std::unique_ptr<bench::PeerDocument> peer;
+  double nodes = 0;  // document, elements, texts and the like; no attributes
+};
+
+Inputs inputs;
+
+// One row per measured query; without an XPath twin the peer is left out.
+struct Row {
+  const char* family;
+  const char* query;
+  bool peer = true;
+};
+
+constexpr Row rows[] = {
+    {"descendant", "//name"},
+    {"descendant", "//item"},
+    {"descendant", "//item/.."},
+    {"descendant", "//keyword"},
+    {"descendant", "//listitem//keyword"},
+    {"child", "/site/people/person/name"},
+    {"child", "/site/regions/*/item/description/text/keyword"},
+    {"child", "/site/closed_auctions/closed_auction/annotation/description/parlist/listitem"},
+    {"attribute", "//person[@id = \"person11\"]/name"},
+    {"attribute", "/site/people/person[@id = \"person11\"]/name"},
+    {"attribute", "//item[@featured]/name"},
+    {"comparison", "//profile[@income > 50000]"},
+    {"comparison", "//closed_auction[price > 300]/date"},
+    {"comparison", "//item[location = \"Germany\"]/name"},
+    {"comparison", "//open_auction[initial < current]"},
+    {"arithmetic", "//bidder[increase * 2 + 1 > 20]"},
+    {"arithmetic", "//open_auction[current - initial > 10]/seller"},
+    {"arithmetic", "(1 to 1000000)[. * 2 + 1 > 1999000]", false},
+};
+
+double residentBytes() {
+  malloc_trim(0);
+  long total = 0, resident = 0;
+  if (FILE* file = std::fopen("/proc/self/statm", "r")) {
+    if (std::fscanf(file, "%ld %ld", &total, &resident) != 2) resident = 0;
+    std::fclose(file);
+  }
+  return static_cast<double>(resident) * static_cast<double>(sysconf(_SC_PAGESIZE));
+}
+
+// Builds both trees, noting what each takes in memory.
+void prepare(double factor) {
+  inputs.xml = bench::auctionData(factor);
+  const auto size = static_cast<double>(inputs.xml.size());
+  const double before = residentBytes();
+  inputs.document = bench::parse(inputs.xml);
+  const double between = residentBytes();
+  inputs.peer = std::make_unique<bench::PeerDocument>(inputs.xml);
+  const double after = residentBytes();
+  for (const NSXMLNode* node = inputs.document.get(); node; node = node->nextNode()) inputs.nodes++;
+  std::printf("document: %.1f MB, %.0f nodes\n", size / 1e6, inputs.nodes);
+  std::printf("memory: %.2f bytes per byte of document; peer %.2f\n", (between - before) / size,
+              (after - between) / size);
+}
+
+void setBytes(benchmark::State& state) {
+  state.SetBytesProcessed(state.iterations() * static_cast<int64_t>(inputs.xml.size()));
+}
+
+void buildTree(benchmark::State& state) {
+  for (auto _ : state) benchmark::DoNotOptimize(bench::parse(inputs.xml).get());
+  setBytes(state);
+}
+
+void buildPeerTree(benchmark::State& state) {
+  for (auto _ : state) bench::PeerDocument document(inputs.xml);
+  setBytes(state);
+}
+
+void walkTree(benchmark::State& state) {
+  for (auto _ : state) {
+    size_t count = 0;
+    for (const NSXMLNode* node = inputs.document.get(); node; node = node->nextNode()) count++;
+    benchmark::DoNotOptimize(count);
+  }
+  state.SetItemsProcessed(state.iterations() * static_cast<int64_t>(inputs.nodes));
+}
+
+void compileQuery(benchmark::State& state) {
+  const std::string text = "//book[price > 10]/title";
+  for (auto _ : state) benchmark::DoNotOptimize(bench::compile(text).get());
+}
+
+void setCounters(benchmark::State& state, const Row& row, size_t selected) {
+  state.counters["selected"] = static_cast<double>(selected);
+  if (std::strncmp(row.query, "//", 2) == 0) {
+    state.counters["nodes/s"] =
+        benchmark::Counter(inputs.nodes, benchmark::Counter::kIsIterationInvariantRate);
+  }
+}
+
+void runEngine(benchmark::State& state, const Row& row) {
+  const auto query = bench::compile(row.query);
+  const auto context = XQueryContext::xqueryContext();
+  size_t selected = bench::evaluate(*context, *query, inputs.document);
+  if (row.peer && bench::PeerQuery(row.query).evaluate(*inputs.peer) != selected) {
+    state.SkipWithError("the peer selects another number of nodes");
+    return;
+  }
+  for (auto _ : state) selected = bench::evaluate(*context, *query, inputs.document);
+  setCounters(state, row, selected);
+}
+
+void runPeer(benchmark::State& state, const Row& row) {
+  const bench::PeerQuery query(row.query);
+  size_t selected = 0;
+  for (auto _ : state) selected = query.evaluate(*inputs.peer);
+  setCounters(state, row, selected);
+}
+
+void registerAll() {
+  const auto add = [](const std::string& name, auto&&... arguments) {
+    benchmark::RegisterBenchmark(name.c_str(), arguments...)->Unit(benchmark::kMillisecond);
+  };
+  add("tree/build", buildTree);
+  add("tree/build peer", buildPeerTree);
+  add("tree/walk", walkTree);
+  add("compile/one line", compileQuery);
+  for (const Row& row : rows) {
+    const std::string name = std::string(row.family) + " " + row.query;
+    add(name, runEngine, row);
+    if (row.peer) add(name + " peer", runPeer, row);
+  }
+}
+
+// Takes our own options out of the arguments. Empty when one is wrong.
+std::optional<double> takeFactor(int& argc, char** argv, bool& scaling) {
+  const char* text = std::getenv("XQUERY_BENCH_FACTOR");
+  int kept = 1;
+  for (int i = 1; i < argc; i++) {
+    if (std::strncmp(argv[i], "--factor=", 9) == 0) {
+      text = argv[i] + 9;
+    } else if (std::strcmp(argv[i], "--scaling") == 0) {
+      scaling = true;
+    } else {
+      argv[kept++] = argv[i];
+    }
+  }
+  argc = kept;
+  if (!text || !*text) return 0.1;
+  char* end = nullptr;
+  const double factor = std::strtod(text, &end);
+  if (*end || !(factor > 0 && factor <= 15)) return std::nullopt;
+  return factor;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  bool scaling = false;
+  const std::optional<double> factor = takeFactor(argc, argv, scaling);
+  if (!factor) {
+    std::fprintf(stderr, "the factor must be above 0 and at most 15\n");
+    return 2;
+  }
+  if (scaling) return bench::reportScaling();
+  benchmark::Initialize(&argc, argv);
+  if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 2;
+  prepare(*factor);
+  registerAll();
+  benchmark::RunSpecifiedBenchmarks();
+  benchmark::Shutdown();
+  return 0;
+}

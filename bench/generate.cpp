@@ -1,0 +1,17 @@
+// xquery_auction FACTOR: writes auction data to standard output.
+#include "AuctionData.h"
+
+#include <cstdio>
+#include <cstdlib>
+
+int main(int argc, char** argv) {
+  char* end = nullptr;
+  const double factor = argc == 2 ? std::strtod(argv[1], &end) : 0;
+  if (!end || *end || !(factor > 0 && factor <= 30)) {
+    std::fprintf(stderr, "usage: %s FACTOR (above 0, at most 30; 1 gives about 110 MB)\n", argv[0]);
+    return 2;
+  }
+  const std::string document = bench::auctionData(factor);
+  const bool written = std::fwrite(document.data(), 1, document.size(), stdout) == document.size();
+  return written && std::fflush(stdout) == 0 ? 0 : 1;
+}

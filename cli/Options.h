@@ -1,0 +1,43 @@
+// What the command line asks for.
+#pragma once
+
+#include <map>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace cli {
+
+// The exit statuses.
+enum Status : int {
+  StatusResult = 0,
+  StatusQueryError = 1,
+  StatusUsage = 2,
+  StatusInput = 3,  // input that cannot be read or parsed, output that cannot be written
+};
+
+struct Binding {
+  std::string name;
+  std::string value;
+};
+
+struct Options {
+  std::optional<std::string> queryText;   // -e
+  std::string queryFile;                  // used when there is no text
+  std::optional<std::string> input;       // none: no context item; "-": standard input
+  std::optional<std::string> outputFile;  // none: standard output
+  std::vector<Binding> variables;
+  std::vector<Binding> documents;
+  std::map<std::string, std::string> namespaces;
+  bool types = false;
+  bool html = false;
+  bool stripSpace = false;
+  bool time = false;
+  unsigned repeat = 1;
+};
+
+// Fills `options`. A status means that the command ends here: help or version was printed, or the
+// usage was wrong and has been explained on standard error.
+[[nodiscard]] std::optional<Status> parseOptions(int argc, char** argv, Options& options);
+
+}  // namespace cli

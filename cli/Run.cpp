@@ -1,0 +1,171 @@
+#include "Run.h"
+
+#include "Output.h"
+#include "Timing.h"
+#include "xquery/xquery.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <fstream>
+#include <iterator>
+
+namespace cli {
+namespace {
+
+using namespace xquery;
+
+// Ends the run with a status; what there is to say has been said.
+struct Stop {
+  Status status;
+};
+
+[[noreturn]] void stop(Status status, const std::string& message) {
+  std::fprintf(stderr, "%s\n", message.c_str());
+  throw Stop{status};
+}
+
+std::string readFile(const std::string& path) {
+  std::ifstream file(path, std::ios::binary);
+  std::string text;
+  if (file) text.assign(std::istreambuf_iterator<char>(file), {});
+  // A directory opens but cannot be read.
+  if (!file || file.bad()) stop(StatusInput, "xquery: " + path + ": " + std::strerror(errno));
+  return text;
+}
+
+Ref<NSString> queryText(const Options& options) {
+  const Ref<NSString> text = NSString::stringWithUTF8(
+      options.queryText ? *options.queryText : readFile(options.queryFile));
+  if (!text) {
+    const std::string name = options.queryText ? "the query given with -e" : options.queryFile;
+    stop(StatusInput, "xquery: " + name + ": not UTF-8 text");
+  }
+  return text;
+}
+
+Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path) {
+  NSXMLParseError error;
+  const uint32_t mode = options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
+  Ref<NSXMLDocument> document = NSXMLDocument::documentWithFile(path, mode, &error);
+  if (document) return document;
+  const std::string name = path == "-" ? "standard input" : path;
+  if (error.line == 0) stop(StatusInput, "xquery: " + name + ": " + error.message);
+  stop(StatusInput, name + ":" + std::to_string(error.line) + ":" + std::to_string(error.column) +
+                        ": " + error.message);
+}
+
+XQueryConstants bindConstants(const Options& options) {
+  XQueryConstants constants;
+  for (const Binding& binding : options.variables) {
+    const Value value = XQueryUntypedAtomic(binding.value);
+    if (!value) stop(StatusUsage, "xquery: --var " + binding.name + ": not UTF-8 text");
+    constants[binding.name] = value;
+  }
+  for (const Binding& binding : options.documents) {
+    constants[binding.name] = readDocument(options, binding.value);
+  }
+  return constants;
+}
+
+Ref<XQuery> compile(const Ref<NSString>& source) {
+  Ref<XQuery> query = XQuery::xqueryWithSource(source);
+  const Ref<NSArray> errors = query->parseErrors();
+  if (!errors || errors->count() == 0) return query;
+  std::string text;
+  for (const Value& error : errors->objects()) {
+    if (!text.empty()) text += '\n';
+    text += cast<NSError>(error)->description()->utf8();
+  }
+  stop(StatusQueryError, text);
+}
+
+// Null for a query that has no value and no error, such as a library module.
+Ref<NSArray> evaluate(XQueryContext& context, const XQuery& query, const XQueryConstants& constants,
+                      const Value& contextItem) {
+  Ref<XQueryError> error;
+  Ref<NSArray> items = context.evaluateXQuery(query, constants, contextItem, &error);
+  if (error) stop(StatusQueryError, error->description()->utf8());
+  if (!items) return items;
+  // A value that is an error counts as one wherever it stands, and then nothing is printed.
+  for (const Value& item : items->objects()) {
+    if (isa<NSError>(item)) {
+      stop(StatusQueryError, cast<NSError>(item)->description()->utf8());
+    }
+  }
+  return items;
+}
+
+void printData(std::string_view bytes, Output& output) {
+  static constexpr char digits[] = "0123456789ABCDEF";
+  for (const char byte : bytes) {
+    const auto value = static_cast<unsigned char>(byte);
+    const char pair[] = {digits[value >> 4], digits[value & 15]};
+    output.append({pair, 2});
+  }
+}
+
+void printItem(const NSObject& item, bool types, Output& output) {
+  if (types) {
+    output.append(XQueryItemTypeName(item));
+    output.append("\t");
+  }
+  if (item.isNode()) {
+    cast<NSXMLNode>(&item)->writeXML(
+        [&output](std::string_view xml) { return output.append(xml); });
+  } else if (isa<NSData>(&item)) {
+    printData(cast<NSData>(&item)->bytes(), output);
+  } else {
+    output.append(XQueryItemStringValue(item));
+  }
+  output.append("\n");
+}
+
+bool print(const Options& options, const NSArray* items) {
+  Output output;
+  const std::string name = options.outputFile.value_or("standard output");
+  if (output.open(options.outputFile)) {
+    const size_t count = items ? items->count() : 0;
+    for (size_t i = 0; i < count && output.error().empty(); i++) {
+      printItem(*items->objectAtIndex(i), options.types, output);
+    }
+    if (output.finish()) return true;
+  }
+  stop(StatusInput, "xquery: cannot write " + name + ": " + output.error());
+}
+
+void runPhases(const Options& options) {
+  Phases phases;
+  const Ref<NSString> source = queryText(options);
+  const Ref<XQuery> query = phases.compile.measure([&] { return compile(source); });
+  Value contextItem;
+  const XQueryConstants constants = phases.parse.measure([&] {
+    if (options.input) contextItem = readDocument(options, *options.input);
+    return bindConstants(options);
+  });
+  const Ref<XQueryContext> context = XQueryContext::xqueryContextWithNamespaces(options.namespaces);
+  Ref<NSArray> items;
+  for (unsigned n = 0; n < options.repeat; n++) {
+    items = nullptr;
+    items =
+        phases.evaluate.measure([&] { return evaluate(*context, *query, constants, contextItem); });
+  }
+  phases.print.measure([&] { return print(options, items.get()); });
+  if (options.time) phases.report(options.repeat > 1);
+}
+
+}  // namespace
+
+Status run(const Options& options) {
+  try {
+    runPhases(options);
+    return StatusResult;
+  } catch (const Stop& end) {
+    return end.status;
+  } catch (const std::exception& error) {
+    std::fprintf(stderr, "xquery: %s\n", error.what());
+    return StatusInput;
+  }
+}
+
+}  // namespace cli

@@ -1,0 +1,32 @@
+#include "Timing.h"
+
+#include <algorithm>
+#include <cstdio>
+
+namespace cli {
+
+std::string Phase::report(bool statistics) const {
+  std::vector<double> sorted = _milliseconds;
+  std::sort(sorted.begin(), sorted.end());
+  const size_t middle = sorted.size() / 2;
+  double median = sorted.empty() ? 0 : sorted[middle];
+  if (!sorted.empty() && sorted.size() % 2 == 0) median = (sorted[middle - 1] + median) / 2;
+  const double minimum = sorted.empty() ? 0 : sorted.front();
+
+  char line[120];
+  if (statistics) {
+    std::snprintf(line, sizeof line, "%-9s median %10.3f ms  minimum %10.3f ms\n", _name, median,
+                  minimum);
+  } else {
+    std::snprintf(line, sizeof line, "%-9s %10.3f ms\n", _name, median);
+  }
+  return line;
+}
+
+void Phases::report(bool statistics) const {
+  for (const Phase* phase : {&parse, &compile, &evaluate, &print}) {
+    std::fputs(phase->report(statistics).c_str(), stderr);
+  }
+}
+
+}  // namespace cli

@@ -1,0 +1,16 @@
+#!/usr/bin/env bash
+# Installs what is missing, builds, and runs every test. XQUERY_PRESET chooses another build
+# (release, debug, asan); XQUERY_WERROR=ON turns warnings into errors.
+set -u
+. "$(dirname "${BASH_SOURCE[0]}")/cmake/prepare.sh"
+
+preset=${XQUERY_PRESET:-release}
+need_packages "${packages[@]}" || exit 1
+(build "$preset" -DXQUERY_WERROR="${XQUERY_WERROR:-OFF}") || exit 1
+
+log=$(mktemp)
+trap 'rm -f "$log"' EXIT
+(cd "$top" && ctest --preset "$preset" -j "$jobs" --no-tests=error "$@") | tee "$log"
+status=${PIPESTATUS[0]}
+grep -E 'tests? failed out of' "$log"
+exit "$status"

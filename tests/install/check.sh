@@ -1,0 +1,36 @@
+#!/usr/bin/env bash
+# check.sh SOURCE_DIR BUILD_DIR cmake|pkg-config|command: installs the build into a new directory
+# and uses it from there as a stranger would.
+set -eu
+source_dir=$1 build_dir=$2 way=$3
+work=$(mktemp -d)
+trap 'rm -rf "$work"' EXIT
+
+cmake --install "$build_dir" --prefix "$work/prefix" >/dev/null
+mkdir "$work/src"
+cp "$source_dir/examples/embed.cpp" "$work/src/"
+books=$source_dir/examples/books.xml
+expected=$'A Field Guide to Lichens\nBrücken & Wege'
+
+case $way in
+  cmake)
+    cp "$source_dir/tests/install/consumer.cmake" "$work/src/CMakeLists.txt"
+    cmake -S "$work/src" -B "$work/build" -G Ninja -DCMAKE_PREFIX_PATH="$work/prefix" >/dev/null
+    cmake --build "$work/build" >/dev/null
+    actual=$("$work/build/embed" "$books")
+    ;;
+  pkg-config)
+    PKG_CONFIG_PATH=$(dirname "$(find "$work/prefix" -name xquery.pc)")
+    export PKG_CONFIG_PATH
+    # The flags are a list of words.
+    # shellcheck disable=SC2046
+    g++ -std=c++20 "$work/src/embed.cpp" -o "$work/embed" $(pkg-config --cflags --libs xquery) \
+      -Wl,-rpath,"$(pkg-config --variable=libdir xquery)"
+    actual=$("$work/embed" "$books")
+    ;;
+  command)
+    actual=$("$work/prefix/bin/xquery" -e '//book[price > 10]/title/text()' "$books")
+    expected=$'A Field Guide to Lichens\nBrücken &amp; Wege'
+    ;;
+esac
+[ "$actual" = "$expected" ] || { echo "unexpected output: $actual" >&2; exit 1; }
