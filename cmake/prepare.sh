@@ -45,8 +45,10 @@ build() {
   [ $# -gt 1 ] && shift && targets=(--target "$@")
   cd "$top" || return 1
   [ -f "build/$preset/xquery" ] || echo "Building build/$preset, which takes a few minutes" >&2
-  quietly cmake --preset "$preset" "${options[@]}" &&
-    quietly cmake --build --preset "$preset" -j "$jobs" "${targets[@]}"
+  if [ ${#options[@]} -gt 0 ] || [ ! -f "build/$preset/build.ninja" ]; then
+    quietly cmake --preset "$preset" "${options[@]}" || return 1
+  fi
+  quietly cmake --build --preset "$preset" -j "$jobs" "${targets[@]}"
 }
 
 mapfile -t packages < <(grep -v '^#' "$top/cmake/debian-packages.txt")
