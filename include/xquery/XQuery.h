@@ -47,8 +47,7 @@ class XQUERY_EXPORT XQuery : public NSCounted {
   XQueryInternal& _internal() const { return *_private; }
 
  protected:
-  explicit XQuery(const Ref<NSString>& source);
-  explicit XQuery(std::string_view source);
+  explicit XQuery(std::unique_ptr<XQueryInternal> internal);
   ~XQuery() override;
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);

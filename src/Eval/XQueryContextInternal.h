@@ -24,7 +24,7 @@ using XQueryFrameRef = std::shared_ptr<XQueryFrame>;
 
 class XQueryContextInternal {
  public:
-  explicit XQueryContextInternal(XQueryContext& owner);
+  XQueryContextInternal();
   ~XQueryContextInternal();
 
   // --- variables -------------------------------------------------------------------------------
@@ -66,14 +66,14 @@ class XQueryContextInternal {
   void popInScopeNamespaces();
   // The innermost constructor's prefix for the URI, else the last of the active prolog's prefixes;
   // null when there is none.
-  Ref<NSString> firstPrefixForNamespace(NSStringView URI) const;
+  Ref<NSString> firstPrefixForNamespace(const Ref<NSString>& URI) const;
   Ref<NSString> contextNamespaceForPrefix(NSStringView prefix) const;
   // A null URI removes the prefix.
   void addNamespace(const Ref<NSString>& URI, const Ref<NSString>& forPrefix);
 
   // --- base URIs of constructed nodes ------------------------------------------------------------
   // Does nothing when either is null.
-  void setBaseURI(const Ref<NSString>& URI, NSXMLNode* forNode);
+  void setBaseURI(const Ref<NSString>& URI, const NSXMLNode* forNode);
   Ref<NSString> baseURIForNode(const NSXMLNode* node) const;
   size_t baseURINodeCount() const { return _baseURINodes.size(); }
 
@@ -92,7 +92,6 @@ class XQueryContextInternal {
   Value XQueryExternalFunctionForQName(const XQueryQName& qName) const;
 
  private:
-  XQueryContext& _owner;
   XQueryFrameRef _variables;
   std::vector<std::vector<Ref<NSXMLNode>>> _inScopeNamespaces;
   std::unordered_map<const NSXMLNode*, Ref<NSString>> _baseURINodes;

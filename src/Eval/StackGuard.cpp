@@ -1,0 +1,59 @@
+#include "Eval/StackGuard.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Prolog/XQueryProlog.h"
+
+#include <pthread.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <string_view>
+
+namespace xquery {
+namespace {
+
+// What must stay free below the deepest checked frame: room for the unchecked work between two
+// checks, for third-party code, and for unwinding an exception. Sanitizer frames are larger.
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr size_t reserve = 1024 * 1024;
+#else
+constexpr size_t reserve = 256 * 1024;
+#endif
+
+uintptr_t lowestUsableAddress() {
+  pthread_attr_t attributes;
+  void* base = nullptr;
+  size_t size = 0;
+  if (pthread_getattr_np(pthread_self(), &attributes) == 0) {
+    pthread_attr_getstack(&attributes, &base, &size);
+    pthread_attr_destroy(&attributes);
+  }
+  // A very small stack keeps half of itself usable.
+  return reinterpret_cast<uintptr_t>(base) + (size / 2 < reserve ? size / 2 : reserve);
+}
+
+thread_local uintptr_t stackLimit = 0;
+
+constexpr std::string_view tooDeep = "limit: expression nested too deeply";
+
+}  // namespace
+
+bool XQueryStackHasRoom() {
+  if (stackLimit == 0) stackLimit = lowestUsableAddress();
+  return reinterpret_cast<uintptr_t>(__builtin_frame_address(0)) > stackLimit;
+}
+
+void XQueryCheckStack(XQueryContext& context) {
+  if (!XQueryStackHasRoom()) context._internal().raise(XQueryError::error(0, tooDeep));
+}
+
+bool XQueryCheckStack(XQueryProlog& prolog) {
+  if (XQueryStackHasRoom()) return true;
+  const auto& errors = prolog.errors();
+  if (errors.empty() || !(errors.back()->msg()->view() == tooDeep)) {
+    prolog.addError(XQueryError::error(0, tooDeep));
+  }
+  return false;
+}
+
+}  // namespace xquery

@@ -1,0 +1,127 @@
+#include "Expr/XQueryLeaves.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Prolog/XQueryProlog.h"
+#include "Types/XQueryNumber.h"
+#include "Types/XQueryString.h"
+#include "Types/XQueryValues.h"
+#include "xquery/Collection.h"
+#include "xquery/Number.h"
+
+namespace xquery {
+namespace {
+
+// `text` followed by the name in double quotes.
+std::string quoting(std::string_view text, const Ref<NSString>& name) {
+  std::string message(text);
+  message += '"';
+  if (name) message += name->utf8();
+  message += '"';
+  return message;
+}
+
+}  // namespace
+
+Ref<XQueryLiteral> XQueryLiteral::literalWithValue(Value value) {
+  return make<XQueryLiteral>(std::move(value));
+}
+
+Ref<XQueryLiteral> XQueryLiteral::stringLiteralWithString(const Ref<NSString>& text) {
+  return literalWithValue(XQueryString::stringWithString(*text));
+}
+
+Ref<XQueryLiteral> XQueryLiteral::integerLiteralWithString(const Ref<NSString>& digits) {
+  return literalWithValue(
+      XQueryNumber::integerWithNumber(*NSDecimalNumber::decimalNumberWithString(digits->view())));
+}
+
+Ref<XQueryLiteral> XQueryLiteral::decimalLiteralWithString(const Ref<NSString>& digits) {
+  return literalWithValue(
+      XQueryNumber::decimalWithNumber(*NSDecimalNumber::decimalNumberWithString(digits->view())));
+}
+
+Ref<XQueryLiteral> XQueryLiteral::doubleLiteralWithString(const Ref<NSString>& text) {
+  // The scanner only hands over text of double-literal form, so there always is a number.
+  double value = 0;
+  scanDouble(text->view(), value);
+  Ref<XQueryNumber> number = XQueryNumber::numberWithDouble(value);
+  return literalWithValue(XQueryNumber::isSpecial(number.get())
+                              ? number
+                              : XQueryNumber::doubleWithNumber(*number));
+}
+
+Ref<NSString> XQueryLiteral::description() const {
+  NSMutableString text;
+  text.appendASCII("<XQueryLiteral - ");
+  text.append(XQueryDescription(_value.get())->view());
+  text.appendASCII(">");
+  return text.string();
+}
+
+Ref<XQueryVariable> XQueryVariable::variableWithName(Ref<NSString> name) {
+  return make<XQueryVariable>(std::move(name));
+}
+
+void XQueryVariable::bindInfoForProlog(XQueryProlog& prolog) {
+  _qName = prolog.variableQNameFromString(_name);
+  if (_qName) _varID = prolog.localVariableIDForQName(_qName);
+}
+
+Value XQueryVariable::evaluateWithContext(XQueryContext& context) const {
+  auto& dynamic = context._internal();
+  NSObject* value = nullptr;
+  if (_varID != 0) {
+    // An empty local slot is never looked up among the globals.
+    value = dynamic.variableForID(_varID);
+  } else if (_qName) {
+    value = dynamic.globalForQName(*_qName);
+  }
+  if (!value) {
+    dynamic.raise(
+        XQueryError::error(8, quoting("reference to undefined variable ", _name), exprLine()));
+  }
+  return value;
+}
+
+XQueryContextItem* XQueryContextItem::contextItem() {
+  static XQueryContextItem* const shared = [] {
+    auto* item = new XQueryContextItem();
+    item->makeImmortal();
+    return item;
+  }();
+  return shared;
+}
+
+Value XQueryContextItem::evaluateWithContext(XQueryContext& context) const {
+  return context._internal().contextItem();
+}
+
+XQueryQNameReference::XQueryQNameReference(Ref<NSString> name, Ref<XQueryQName> qName, int64_t line)
+    : XQueryExpr(Kind::QNameReference, line), _name(std::move(name)), _qName(std::move(qName)) {
+  if (_name) XQueryQName::parseQNameString(_name, _prefix, _localPart);
+}
+
+Ref<XQueryQNameReference> XQueryQNameReference::qNameReferenceWithString(Ref<NSString> name,
+                                                                         int64_t line) {
+  return make<XQueryQNameReference>(std::move(name), Ref<XQueryQName>(), line);
+}
+
+Ref<XQueryQNameReference> XQueryQNameReference::qNameReferenceWithQName(Ref<XQueryQName> qName,
+                                                                        int64_t line) {
+  return make<XQueryQNameReference>(Ref<NSString>(), std::move(qName), line);
+}
+
+Value XQueryQNameReference::evaluateWithContext(XQueryContext& context) const {
+  if (_qName) return _qName;
+  auto& dynamic = context._internal();
+  if (_localPart && _localPart->length() > 0) {
+    const Ref<NSString> URI = dynamic.contextNamespaceForPrefix(_prefix->view());
+    if (URI || _prefix->length() == 0) {
+      // A name resolved here keeps no prefix.
+      return XQueryQName::qname(_localPart, URI);
+    }
+  }
+  dynamic.raise(XQueryError::error(1, quoting("can't resolve QName for ", _name), exprLine()));
+}
+
+}  // namespace xquery

@@ -1,0 +1,50 @@
+#include "Expr/XQueryLists.h"
+
+#include "Eval/StackGuard.h"
+#include "Expr/XQueryLeaves.h"
+#include "Expr/XQuerySequence.h"
+#include "xquery/Collection.h"
+
+namespace xquery {
+
+void XQueryExprList::addObject(Ref<XQueryExpr> element) {
+  if (!element) element = XQueryLiteral::literalWithValue(NSNull::null());
+  _storage.append(std::move(element));
+}
+
+void XQueryExprList::insertObject(const Ref<XQueryExpr>& element, size_t atIndex) {
+  if (_storage.hasValue()) {
+    _storage.moveValueToArray();
+    _storage.append(element);
+  }
+  if (_storage.hasArray()) _storage.insertInArray(atIndex, element);
+}
+
+void XQueryExprList::replaceObjectAtIndex(size_t index, Ref<XQueryExpr> withObject) {
+  _storage.replaceAtIndex(index, std::move(withObject));
+}
+
+void XQueryExprList::bindInfoForProlog(XQueryProlog& prolog) {
+  if (!XQueryCheckStack(prolog)) return;
+  for (size_t index = 0; index < count(); ++index) objectAtIndex(index)->bindInfoForProlog(prolog);
+}
+
+Value XQueryExprList::evaluateWithContext(XQueryContext& context) const {
+  XQueryCheckStack(context);
+  XQueryGatherer results;
+  for (size_t index = 0; index < count(); ++index) {
+    results.add(objectAtIndex(index)->evaluateWithContext(context));
+  }
+  return results.value();
+}
+
+Value XQueryArgs::evaluateWithContext(XQueryContext& context) const {
+  auto arguments = NSArray::array();
+  arguments->objects().reserve(count());
+  for (size_t index = 0; index < count(); ++index) {
+    arguments->objects().push_back(objectAtIndex(index)->evaluateWithContext(context));
+  }
+  return arguments;
+}
+
+}  // namespace xquery

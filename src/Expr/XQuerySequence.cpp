@@ -1,0 +1,94 @@
+#include "Expr/XQuerySequence.h"
+
+#include <vector>
+
+namespace xquery {
+
+Ref<XQuerySequence> XQuerySequence::sequenceWithItem(const Value& item) {
+  auto sequence = XQuerySequence::sequence();
+  sequence->addObject(item);
+  return sequence;
+}
+
+// Arrays a host hands in may nest to any depth, so the flattening keeps its own stack.
+void XQuerySequence::addObject(const Value& item) {
+  struct Position {
+    const NSArray* array;
+    size_t next;
+  };
+  std::vector<Position> open;
+  auto addOne = [&](const Value& value) {
+    if (!value || isNull(value)) return;
+    if (const auto* array = dyn_cast<NSArray>(value)) {
+      open.push_back({array, 0});
+    } else {
+      _objects.push_back(value);
+    }
+  };
+  addOne(item);
+  while (!open.empty()) {
+    Position& top = open.back();
+    if (top.next < top.array->count()) {
+      addOne(top.array->objects()[top.next++]);
+    } else {
+      open.pop_back();
+    }
+  }
+}
+
+void XQuerySequence::insertObject(const Value& item, size_t atIndex) {
+  if (!item || isNull(item)) return;
+  if (atIndex > _objects.size()) atIndex = _objects.size();
+  _objects.insert(_objects.begin() + static_cast<std::ptrdiff_t>(atIndex), item);
+}
+
+void XQuerySequence::removeLastObject() {
+  if (!_objects.empty()) _objects.pop_back();
+}
+
+void XQuerySequence::removeObjectAtIndex(size_t index) {
+  if (index < _objects.size()) {
+    _objects.erase(_objects.begin() + static_cast<std::ptrdiff_t>(index));
+  }
+}
+
+void XQuerySequence::replaceObjectAtIndex(size_t index, const Value& withObject) {
+  if (index < _objects.size()) _objects[index] = withObject;
+}
+
+Value normalised(Value value) {
+  const auto* array = dyn_cast<NSArray>(value);
+  if (!array || array->count() > 1) return value;
+  return array->count() == 1 ? array->objects().front() : Value(NSNull::null());
+}
+
+void XQueryGatherer::add(Value value) {
+  if (!value || isNull(value)) return;
+  if (_sequence) {
+    _sequence->addObject(value);
+  } else if (_first) {
+    _sequence = XQuerySequence::sequenceWithItem(std::exchange(_first, Value()));
+    _sequence->addObject(value);
+  } else {
+    _first = std::move(value);
+  }
+}
+
+Value XQueryGatherer::value() {
+  if (_sequence) return normalised(std::move(_sequence));
+  if (_first) return normalised(std::move(_first));
+  return NSNull::null();
+}
+
+XQueryItemList::XQueryItemList(const NSObject* value) {
+  if (!value || value->kind() == Kind::Null) return;
+  if (const auto* array = dyn_cast<NSArray>(value)) {
+    _array = array;
+    _count = array->count();
+  } else {
+    _single = const_cast<NSObject*>(value);
+    _count = 1;
+  }
+}
+
+}  // namespace xquery
