@@ -68,7 +68,6 @@ enum class Kind : uint8_t {
   PrologItem,
   FunctionDecl,
   VarDecl,
-  Param,
   ParsedModule,
   PathResults,
   PathStepFirst,
@@ -89,6 +88,7 @@ enum class Kind : uint8_t {
   WildCardNameTest,
   OperatorExpr,
   TypeDeclaration,
+  Param,
   OtherExpr,
   ExprLast = 255,
 };

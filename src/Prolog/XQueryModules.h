@@ -1,12 +1,12 @@
 // Namespace IDs of one compilation, and the library modules it loaded.
 #pragma once
 
+#include "xquery/Object.h"
+#include "xquery/String.h"
+
 #include <cstdint>
 #include <unordered_map>
 #include <vector>
-
-#include "xquery/Object.h"
-#include "xquery/String.h"
 
 namespace xquery {
 

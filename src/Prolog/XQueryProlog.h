@@ -1,17 +1,17 @@
 // The static context of one module.
 #pragma once
 
-#include <cstdint>
-#include <string>
-#include <unordered_map>
-#include <vector>
-
 #include "Types/XQueryQName.h"
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
+
+#include <cstdint>
+#include <string>
+#include <unordered_map>
+#include <vector>
 
 namespace xquery {
 

@@ -1,0 +1,108 @@
+// What a prolog declares: global variables and functions, and the parameters of the latter.
+//
+// A prolog owns its declarations, and so does every prolog that imported them; a declaration knows
+// the prolog that declared it but does not own it. That prolog lives as long as the compilation's
+// registry of modules, so the pointer stays good wherever the declaration is used.
+#pragma once
+
+#include "Expr/XQueryExpr.h"
+#include "Expr/XQueryTypeDeclaration.h"
+#include "Types/XQueryQName.h"
+#include "xquery/String.h"
+
+#include <vector>
+
+namespace xquery {
+
+class XQueryProlog;
+
+class XQueryVarDecl : public NSCounted {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::VarDecl; }
+
+  // `forType` may be null; a null expression makes the variable external.
+  [[nodiscard]] static Ref<XQueryVarDecl> varDecl(Ref<XQueryQName> qName,
+                                                  Ref<XQueryTypeDeclaration> forType,
+                                                  Ref<XQueryExpr> withExpr, XQueryProlog& prolog);
+
+  const Ref<XQueryQName>& name() const { return _name; }
+  XQueryTypeDeclaration* type() const { return _type.get(); }
+  XQueryExpr* expr() const { return _expr.get(); }
+  XQueryProlog& prolog() const { return _prolog; }
+  bool isExternal() const { return !_expr; }
+
+ protected:
+  XQueryVarDecl(Ref<XQueryQName> name, Ref<XQueryTypeDeclaration> type, Ref<XQueryExpr> expr,
+                XQueryProlog& prolog);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<XQueryQName> _name;
+  Ref<XQueryTypeDeclaration> _type;
+  Ref<XQueryExpr> _expr;
+  XQueryProlog& _prolog;
+};
+
+// A parameter of a declared function.
+class XQueryParam : public XQueryExpr {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::Param; }
+
+  // The name as written, prefix included, without the dollar sign; `type` may be null.
+  [[nodiscard]] static Ref<XQueryParam> paramWithName(Ref<NSString> name,
+                                                      Ref<XQueryTypeDeclaration> type);
+
+  const Ref<NSString>& name() const { return _name; }
+  XQueryTypeDeclaration* type() const { return _type.get(); }
+  // The local variable that takes the argument; 0 until bound.
+  int64_t varID() const { return _varID; }
+
+  // A name that the function's parameter list already used is error 39.
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  // NSNull: a parameter is not evaluated for a value.
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryParam(Ref<NSString> name, Ref<XQueryTypeDeclaration> type);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<NSString> _name;
+  Ref<XQueryTypeDeclaration> _type;
+  int64_t _varID = 0;
+};
+
+class XQueryFunctionDecl : public NSCounted {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::FunctionDecl; }
+
+  // `forType` may be null; a null expression makes the function external.
+  [[nodiscard]] static Ref<XQueryFunctionDecl> functionDecl(
+      Ref<XQueryQName> name, Ref<XQueryTypeDeclaration> forType,
+      std::vector<Ref<XQueryParam>> withParams, Ref<XQueryExpr> expr, XQueryProlog& prolog);
+
+  const Ref<XQueryQName>& name() const { return _name; }
+  XQueryTypeDeclaration* type() const { return _type.get(); }
+  const std::vector<Ref<XQueryParam>>& params() const { return _params; }
+  XQueryExpr* expr() const { return _expr.get(); }
+  XQueryProlog& prolog() const { return _prolog; }
+  bool isExternal() const { return !_expr; }
+
+ protected:
+  XQueryFunctionDecl(Ref<XQueryQName> name, Ref<XQueryTypeDeclaration> type,
+                     std::vector<Ref<XQueryParam>> params, Ref<XQueryExpr> expr,
+                     XQueryProlog& prolog);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<XQueryQName> _name;
+  Ref<XQueryTypeDeclaration> _type;
+  std::vector<Ref<XQueryParam>> _params;
+  Ref<XQueryExpr> _expr;
+  XQueryProlog& _prolog;
+};
+
+}  // namespace xquery
