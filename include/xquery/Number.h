@@ -103,6 +103,10 @@ class XQUERY_EXPORT NSNumber : public NSCounted {
 
   Storage storage() const { return static_cast<Storage>(_flags); }
   bool isBoolean() const { return storage() == Storage::Boolean; }
+  // The payload in place, for code that must not copy it; null when it is stored in another form.
+  const NSDecimal* storedDecimal() const {
+    return storage() == Storage::Decimal ? &_decimal : nullptr;
+  }
 
   bool boolValue() const;
   double doubleValue() const;

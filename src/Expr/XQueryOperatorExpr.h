@@ -39,8 +39,13 @@ class XQueryOperatorExpr : public XQueryExpr {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::OperatorExpr; }
 
+  // A null operand (one that is absent from the query) is the empty sequence.
   [[nodiscard]] static Ref<XQueryOperatorExpr> operatorExpr(int type, Ref<XQueryExpr> withRightExpr);
-  void setLeftExpr(Ref<XQueryExpr> left) { _left = std::move(left); }
+  // Plus and minus whose left operand was never set are the unary signs. A null argument is a left
+  // operand that is absent from the query: it is set, to the empty sequence, so that a binary
+  // operator with an absent operand is not taken for a sign.
+  void setLeftExpr(Ref<XQueryExpr> left);
+  // Null until set.
   XQueryExpr* left() const { return _left.get(); }
   XQueryExpr* right() const { return _right.get(); }
   int operatorType() const { return _type; }
