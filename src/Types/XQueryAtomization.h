@@ -9,7 +9,9 @@ namespace xquery {
 
 class XQueryContext;
 
-inline bool XQueryIsNode(const NSObject* object) { return object && object->isNode(); }
+inline bool XQueryIsNode(const NSObject* object) {
+  return object && object->isNode();
+}
 
 // What a number of items an atomization accepts.
 enum XQueryOccurrence : int {
@@ -28,6 +30,8 @@ Value XQueryAtomizationCheckingOccurrence(const Value& value, int code, XQueryCo
 
 // One of the two shared truth values, or the XQueryError passed in.
 Value XQueryEffectiveBooleanValue(const Value& value, XQueryContext& context);
-inline bool XQueryIsTrue(const Value& value) { return value.get() == NSNumber::trueValue(); }
+inline bool XQueryIsTrue(const Value& value) {
+  return value.get() == NSNumber::trueValue();
+}
 
 }  // namespace xquery

@@ -1,11 +1,11 @@
 // What the data model asks of a node.
 #pragma once
 
-#include <vector>
-
 #include "xquery/Object.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
+
+#include <vector>
 
 namespace xquery {
 

@@ -1,11 +1,11 @@
 // Expanded names as values.
 #pragma once
 
-#include <functional>
-
 #include "xquery/Object.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
+
+#include <functional>
 
 namespace xquery {
 
@@ -42,8 +42,8 @@ class XQueryQName : public NSCounted {
   Ref<NSString> XQueryStringValue() const;
   Ref<NSString> description() const;
 
-  // The interned name that nodes of this name carry; made on first use by the binding pass.
-  const NSXMLExpandedNameRef& expandedName() const { return _expandedName; }
+  // The interned name that nodes of this name carry; made on first use.
+  const NSXMLExpandedNameRef& expandedName() const;
 
  protected:
   XQueryQName(Ref<NSString> namespaceURI, Ref<NSString> localPart, Ref<NSString> prefixHint);
@@ -54,7 +54,8 @@ class XQueryQName : public NSCounted {
   Ref<NSString> _namespaceURI;
   Ref<NSString> _localPart;
   Ref<NSString> _prefixHint;
-  NSXMLExpandedNameRef _expandedName;
+  mutable NSXMLExpandedNameRef _expandedName;
+  mutable bool _isInterned = false;
 };
 
 // For tables keyed by QName.

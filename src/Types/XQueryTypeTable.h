@@ -1,9 +1,9 @@
 // Built-in type identifiers, their names and the derivation rules between them.
 #pragma once
 
-#include <cstdint>
-
 #include "xquery/Object.h"
+
+#include <cstdint>
 
 namespace xquery {
 
@@ -15,9 +15,9 @@ using XQueryTypeID = intptr_t;
 // The numbering is fixed: other code compares against the numbers and relies on their order (a type
 // has a larger number than the type it derives from).
 enum XQueryType : XQueryTypeID {
-  XQueryTypeNone = 0,           // a node, or an object without a type
-  XQueryTypeError = 1,          // an error record
-  XQueryTypeEmpty = 2,          // the empty sequence
+  XQueryTypeNone = 0,   // a node, or an object without a type
+  XQueryTypeError = 1,  // an error record
+  XQueryTypeEmpty = 2,  // the empty sequence
   XQueryTypeAnyType = 3,
   XQueryTypeAnyComplex = 4,
   XQueryTypeAnySimpleType = 6,

@@ -1,0 +1,101 @@
+#include "Types/XQueryAtomization.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Types/XQueryNodeFunctions.h"
+#include "Types/XQueryNumber.h"
+#include "xquery/Collection.h"
+#include "xquery/XQuery.h"
+
+namespace xquery {
+
+namespace {
+
+[[noreturn]] void raiseWrongCount(XQueryContext& context) {
+  context._internal().raise(XQueryError::error(6, "invalid type for automization"));
+}
+
+bool allAtomic(const std::vector<Value>& items) {
+  for (const Value& item : items) {
+    if (!XQueryIsAtomicType(item.get())) return false;
+  }
+  return true;
+}
+
+// Two items or more, none of them counted by the caller's occurrence.
+Value typedValues(const Value& sequence, XQueryContext& context) {
+  const std::vector<Value>& items = cast<NSArray>(sequence)->objects();
+  if (allAtomic(items)) return sequence;
+  std::vector<Value> values;
+  values.reserve(items.size());
+  for (const Value& item : items) {
+    if (!isa<NSNull>(item)) values.push_back(XQueryTypedValue(item, context));
+  }
+  if (values.empty()) return NSNull::null();
+  return NSArray::arrayWithObjects(std::move(values));
+}
+
+bool isFalseNumber(const NSNumber& number) {
+  switch (number.storage()) {
+    case NSNumber::Storage::Boolean:
+      return &number == NSNumber::falseValue();
+    case NSNumber::Storage::Int64:
+    case NSNumber::Storage::UInt64:
+      return number.unsignedLongLongValue() == 0 && number.longLongValue() == 0;
+    default:
+      return number.isEqualToNumber(*XQueryNumber::zero()) ||
+             number.isEqualToNumber(*XQueryNumber::nan());
+  }
+}
+
+bool effectiveBooleanValueOfItem(const NSObject& item) {
+  switch (item.kind()) {
+    case Kind::Null:
+      return false;
+    case Kind::String:
+    case Kind::TypedString:
+      return cast<NSString>(&item)->length() != 0;
+    case Kind::Number:
+    case Kind::DecimalNumber:
+    case Kind::TypedNumber:
+      return !isFalseNumber(*cast<NSNumber>(&item));
+    default:
+      return true;
+  }
+}
+
+}  // namespace
+
+Value XQueryTypedValue(const Value& item, XQueryContext& context) {
+  if (XQueryIsNode(item.get())) return XQueryNodeTypedValue(cast<NSXMLNode>(item));
+  if (XQueryIsAtomicType(item.get())) return item;
+  context._internal().raise(XQueryError::error(6, "invalid type"));
+}
+
+Value XQueryAtomization(const Value& value, XQueryContext& context) {
+  return XQueryAtomizationCheckingOccurrence(value, XQueryOccurrenceAny, context);
+}
+
+Value XQueryAtomizationCheckingOccurrence(const Value& value, int code, XQueryContext& context) {
+  const NSArray* sequence = dyn_cast<NSArray>(value.get());
+  if (isa<NSNull>(value) || (sequence && sequence->count() == 0)) {
+    if (code >= XQueryOccurrenceExactlyOne) raiseWrongCount(context);
+    return NSNull::null();
+  }
+  if (!sequence) return XQueryTypedValue(value, context);
+  if (sequence->count() == 1) return XQueryTypedValue(sequence->objects().front(), context);
+  if (code == XQueryOccurrenceExactlyOne) raiseWrongCount(context);
+  return typedValues(value, context);
+}
+
+// A sequence of several atomic values counts as true: this is lenient on purpose.
+Value XQueryEffectiveBooleanValue(const Value& value, XQueryContext&) {
+  const NSObject* item = value.get();
+  while (const NSArray* sequence = dyn_cast<NSArray>(item)) {
+    if (sequence->count() != 1) return NSNumber::numberWithBool(sequence->count() > 1);
+    item = sequence->objects().front().get();
+  }
+  if (isa<XQueryError>(item)) return Value(const_cast<NSObject*>(item));
+  return NSNumber::numberWithBool(!item || effectiveBooleanValueOfItem(*item));
+}
+
+}  // namespace xquery
