@@ -4,13 +4,13 @@
 // them as UTF-8 gives U+FFFD. Ordering is by code point, equality by code unit.
 #pragma once
 
+#include "xquery/Object.h"
+
 #include <cstdint>
 #include <cstring>
 #include <optional>
 #include <string>
 #include <string_view>
-
-#include "xquery/Object.h"
 
 namespace xquery {
 
@@ -78,12 +78,15 @@ class XQUERY_EXPORT NSString : public NSCounted {
 
   // UTF-8 text (RFC 3629). Null when it is not well formed.
   [[nodiscard]] static Ref<NSString> stringWithUTF8(std::string_view text);
+  // The same, but each byte that starts no well-formed sequence becomes U+FFFD; for messages.
+  [[nodiscard]] static Ref<NSString> stringWithUTF8Replacing(std::string_view text);
   // For literals in code; the text must be ASCII.
   [[nodiscard]] static Ref<NSString> stringWithASCII(std::string_view text);
   [[nodiscard]] static Ref<NSString> stringWithUTF16(std::u16string_view text);
   // Copies the text.
   [[nodiscard]] static Ref<NSString> stringWithView(NSStringView text);
-  // References text that lives in the tree of `owner`; the tree is kept alive. Short text is copied.
+  // References text that lives in the tree of `owner`; the tree is kept alive. Short text is
+  // copied.
   [[nodiscard]] static Ref<NSString> stringInTreeOf(const NSXMLNode* owner, NSStringView text);
   // The shared empty string.
   static const Ref<NSString>& empty();
@@ -141,6 +144,8 @@ class XQUERY_EXPORT NSMutableString {
   [[nodiscard]] Ref<NSString> string() const { return NSString::stringWithView(view()); }
 
  private:
+  void widen();
+
   std::string _ascii;
   std::u16string _wide;
   bool _isWide = false;

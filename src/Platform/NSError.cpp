@@ -1,0 +1,77 @@
+#include "Platform/NSLog.h"
+#include "xquery/Error.h"
+
+#include <string>
+
+namespace xquery {
+
+namespace {
+
+const Ref<NSString>& errorDomain() {
+  static const Ref<NSString> domain = [] {
+    Ref<NSString> text = NSString::stringWithASCII("XQueryErrorDomain");
+    text->makeImmortal();
+    return text;
+  }();
+  return domain;
+}
+
+// A dictionary only for what is there: no message, no entry; line 0, no entry; neither, nothing.
+std::optional<NSError::UserInfo> userInfoFor(const Ref<NSString>& msg, int64_t line) {
+  if (!msg && line == 0) return std::nullopt;
+  NSError::UserInfo info{msg, std::nullopt};
+  if (line != 0) info.errorLine = line;
+  return info;
+}
+
+}  // namespace
+
+NSError::NSError(Kind kind, Ref<NSString> domain, int64_t code, std::optional<UserInfo> userInfo)
+    : NSCounted(kind), _domain(std::move(domain)), _code(code), _userInfo(std::move(userInfo)) {}
+
+Ref<NSString> NSError::localizedDescription() const {
+  NSMutableString text;
+  text.append(_domain->view());
+  text.appendASCII(":" + std::to_string(_code));
+  return text.string();
+}
+
+XQueryError::XQueryError(int64_t number, Ref<NSString> msg, int64_t line)
+    : NSError(Kind::QueryError, errorDomain(), number, userInfoFor(msg, line)),
+      _err(number),
+      _msg(std::move(msg)),
+      _line(line) {
+  if (XQueryLogEnabled()) NSLog(XQueryError::localizedDescription()->utf8());
+}
+
+Ref<XQueryError> XQueryError::error(int64_t number, const Ref<NSString>& withMsg, int64_t atLine) {
+  return make<XQueryError>(number, withMsg, atLine + 1);
+}
+
+Ref<XQueryError> XQueryError::error(int64_t number, const Ref<NSString>& withMsg) {
+  return make<XQueryError>(number, withMsg, int64_t{0});
+}
+
+Ref<XQueryError> XQueryError::error(int64_t number, std::string_view withMsg, int64_t atLine) {
+  return error(number, NSString::stringWithUTF8Replacing(withMsg), atLine);
+}
+
+Ref<XQueryError> XQueryError::error(int64_t number, std::string_view withMsg) {
+  return error(number, NSString::stringWithUTF8Replacing(withMsg));
+}
+
+Ref<NSString> XQueryError::localizedDescription() const {
+  const UserInfo* info = userInfo();
+  NSMutableString text;
+  text.appendASCII("XQueryError:" + std::to_string(code()) + " - \"");
+  if (info && info->errorMessage) {
+    text.append(info->errorMessage->view());
+  } else {
+    text.appendASCII("(null)");
+  }
+  text.appendASCII("\"");
+  if (info && info->errorLine) text.appendASCII(" at line:" + std::to_string(*info->errorLine));
+  return text.string();
+}
+
+}  // namespace xquery

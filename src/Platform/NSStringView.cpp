@@ -1,0 +1,269 @@
+// Questions about text: search, comparison, hashing, conversion to UTF-8.
+//
+// Both representations give the same answers. 8-bit text against 8-bit text, the common case, goes
+// through the C library's byte functions; the other pairings share one implementation per question.
+#include "xquery/String.h"
+
+#include <algorithm>
+#include <type_traits>
+#include <vector>
+
+namespace xquery {
+
+namespace {
+
+bool isHighSurrogate(char16_t unit) {
+  return unit >= 0xD800 && unit < 0xDC00;
+}
+bool isLowSurrogate(char16_t unit) {
+  return unit >= 0xDC00 && unit < 0xE000;
+}
+
+template <class Unit>
+char16_t widened(Unit unit) {
+  return static_cast<char16_t>(static_cast<std::make_unsigned_t<Unit>>(unit));
+}
+template <>
+char16_t widened(char16_t unit) {
+  return unit;
+}
+
+template <class Function>
+auto withUnits(NSStringView text, Function function) {
+  return text.isWide() ? function(text.wideUnits()) : function(text.asciiUnits());
+}
+
+template <class UnitA, class UnitB>
+bool sameUnits(const UnitA* a, const UnitB* b, uint32_t length) {
+  if constexpr (std::is_same_v<UnitA, UnitB>) {
+    return length == 0 || std::memcmp(a, b, size_t{length} * sizeof(UnitA)) == 0;
+  } else {
+    for (uint32_t index = 0; index < length; ++index) {
+      if (widened(a[index]) != widened(b[index])) return false;
+    }
+    return true;
+  }
+}
+
+template <class UnitA, class UnitB>
+uint32_t firstDifference(const UnitA* a, const UnitB* b, uint32_t length) {
+  uint32_t index = 0;
+  if constexpr (std::is_same_v<UnitA, UnitB>) {
+    // Whole words first; the word that differs is looked at unit by unit.
+    constexpr uint32_t step = sizeof(uint64_t) / sizeof(UnitA);
+    for (; index + step <= length; index += step) {
+      uint64_t wordA = 0;
+      uint64_t wordB = 0;
+      std::memcpy(&wordA, a + index, sizeof wordA);
+      std::memcpy(&wordB, b + index, sizeof wordB);
+      if (wordA != wordB) break;
+    }
+  }
+  while (index < length && widened(a[index]) == widened(b[index])) ++index;
+  return index;
+}
+
+// The code point that begins at `index`; a lone surrogate is itself.
+char32_t codePointAt(NSStringView text, uint32_t index) {
+  const char16_t high = text[index];
+  if (!isHighSurrogate(high) || index + 1 >= text.length()) return high;
+  const char16_t low = text[index + 1];
+  if (!isLowSurrogate(low)) return high;
+  return 0x10000 + ((char32_t{high} - 0xD800U) << 10) + (low - 0xDC00U);
+}
+
+// Knuth, Morris and Pratt's search: linear whatever the texts are, so that a hostile pattern
+// cannot make a search take the product of the lengths.
+template <class Unit, class PatternUnit>
+uint32_t findLinear(const Unit* text, uint32_t length, const PatternUnit* pattern,
+                    uint32_t patternLength, uint32_t from) {
+  std::vector<uint32_t> fallback(patternLength, 0);
+  for (uint32_t index = 1, matched = 0; index < patternLength; ++index) {
+    while (matched && pattern[index] != pattern[matched]) matched = fallback[matched - 1];
+    if (pattern[index] == pattern[matched]) ++matched;
+    fallback[index] = matched;
+  }
+  for (uint32_t index = from, matched = 0; index < length; ++index) {
+    while (matched && widened(text[index]) != widened(pattern[matched])) {
+      matched = fallback[matched - 1];
+    }
+    if (widened(text[index]) == widened(pattern[matched])) ++matched;
+    if (matched == patternLength) return index + 1 - patternLength;
+  }
+  return NSStringView::notFound;
+}
+
+template <class Unit>
+uint32_t findUnit(const Unit* text, uint32_t length, char16_t unit, uint32_t from) {
+  if constexpr (sizeof(Unit) == 1) {
+    if (unit >= 0x80) return NSStringView::notFound;
+    const void* found = std::memchr(text + from, unit, length - from);
+    return found ? static_cast<uint32_t>(static_cast<const Unit*>(found) - text)
+                 : NSStringView::notFound;
+  } else {
+    const Unit* found = std::find(text + from, text + length, unit);
+    return found != text + length ? static_cast<uint32_t>(found - text) : NSStringView::notFound;
+  }
+}
+
+template <class Unit, class PatternUnit>
+uint32_t findUnits(const Unit* text, uint32_t length, const PatternUnit* pattern,
+                   uint32_t patternLength, uint32_t from) {
+  if constexpr (sizeof(Unit) == 1 && sizeof(PatternUnit) == 1) {
+    const void* found = memmem(text + from, length - from, pattern, patternLength);
+    return found ? static_cast<uint32_t>(static_cast<const Unit*>(found) - text)
+                 : NSStringView::notFound;
+  } else {
+    // Short patterns are tried at each place where their first unit stands.
+    constexpr uint32_t shortLength = 16;
+    if (patternLength > shortLength) {
+      return findLinear(text, length, pattern, patternLength, from);
+    }
+    const uint32_t last = length - patternLength;
+    while (from <= last) {
+      const uint32_t start = findUnit(text, last + 1, widened(pattern[0]), from);
+      if (start == NSStringView::notFound) break;
+      if (sameUnits(text + start, pattern, patternLength)) return start;
+      from = start + 1;
+    }
+    return NSStringView::notFound;
+  }
+}
+
+// Four units as 16-bit lanes, so that both representations give the same hash.
+uint64_t fourUnits(const char* units) {
+  uint32_t bytes = 0;
+  std::memcpy(&bytes, units, sizeof bytes);
+  uint64_t word = bytes;
+  word = (word | (word << 16)) & 0x0000FFFF0000FFFFULL;
+  return (word | (word << 8)) & 0x00FF00FF00FF00FFULL;
+}
+uint64_t fourUnits(const char16_t* units) {
+  uint64_t word = 0;
+  std::memcpy(&word, units, sizeof word);
+  return word;
+}
+
+template <class Unit>
+uint32_t hashUnits(const Unit* units, uint32_t length) {
+  constexpr uint64_t multiplier = 0x9E3779B97F4A7C15ULL;
+  uint64_t hash = length * multiplier;
+  uint32_t index = 0;
+  for (; index + 4 <= length; index += 4) {
+    hash = (hash ^ fourUnits(units + index)) * multiplier;
+    hash ^= hash >> 32;
+  }
+  for (; index < length; ++index) {
+    hash = (hash ^ widened(units[index])) * multiplier;
+    hash ^= hash >> 32;
+  }
+  return static_cast<uint32_t>(hash);
+}
+
+void appendUTF8(std::string& out, char32_t point) {
+  if (point < 0x80) {
+    out += static_cast<char>(point);
+  } else if (point < 0x800) {
+    out += static_cast<char>(0xC0 | (point >> 6));
+    out += static_cast<char>(0x80 | (point & 0x3F));
+  } else if (point < 0x10000) {
+    out += static_cast<char>(0xE0 | (point >> 12));
+    out += static_cast<char>(0x80 | ((point >> 6) & 0x3F));
+    out += static_cast<char>(0x80 | (point & 0x3F));
+  } else {
+    out += static_cast<char>(0xF0 | (point >> 18));
+    out += static_cast<char>(0x80 | ((point >> 12) & 0x3F));
+    out += static_cast<char>(0x80 | ((point >> 6) & 0x3F));
+    out += static_cast<char>(0x80 | (point & 0x3F));
+  }
+}
+
+}  // namespace
+
+NSStringView NSStringView::substring(uint32_t from, uint32_t count) const {
+  from = std::min(from, _length);
+  count = std::min(count, _length - from);
+  return _wide ? NSStringView(wideUnits() + from, count) : NSStringView(asciiUnits() + from, count);
+}
+
+uint32_t NSStringView::find(NSStringView text, uint32_t from) const {
+  if (from > _length || text._length > _length - from) return notFound;
+  if (text.isEmpty()) return from;
+  return withUnits(*this, [&](auto* units) {
+    return withUnits(text, [&](auto* pattern) {
+      return findUnits(units, _length, pattern, text._length, from);
+    });
+  });
+}
+
+uint32_t NSStringView::find(char16_t unit, uint32_t from) const {
+  if (from >= _length) return notFound;
+  return withUnits(*this, [&](auto* units) { return findUnit(units, _length, unit, from); });
+}
+
+bool NSStringView::startsWith(NSStringView text) const {
+  return text._length <= _length && substring(0, text._length).equals(text);
+}
+
+bool NSStringView::endsWith(NSStringView text) const {
+  return text._length <= _length && substring(_length - text._length).equals(text);
+}
+
+int NSStringView::compare(NSStringView other) const {
+  const uint32_t common = std::min(_length, other._length);
+  const uint32_t index = withUnits(*this, [&](auto* a) {
+    return withUnits(other, [&](auto* b) { return firstDifference(a, b, common); });
+  });
+  if (index == common) {
+    return _length == other._length ? 0 : _length < other._length ? -1 : 1;
+  }
+  // After a high surrogate that the texts share, a unit that completes the pair wins over one that
+  // leaves the surrogate alone.
+  if (index > 0 && isHighSurrogate((*this)[index - 1])) {
+    const bool completes = isLowSurrogate((*this)[index]);
+    if (completes != isLowSurrogate(other[index])) return completes ? 1 : -1;
+  }
+  return codePointAt(*this, index) < codePointAt(other, index) ? -1 : 1;
+}
+
+bool NSStringView::equals(NSStringView other) const {
+  if (_length != other._length) return false;
+  return withUnits(*this, [&](auto* a) {
+    return withUnits(other, [&](auto* b) { return sameUnits(a, b, _length); });
+  });
+}
+
+uint32_t NSStringView::hash() const {
+  return withUnits(*this, [&](auto* units) { return hashUnits(units, _length); });
+}
+
+void NSStringView::appendUTF8To(std::string& out) const {
+  if (!_wide) {
+    out.append(asciiUnits(), _length);
+    return;
+  }
+  const char16_t* units = wideUnits();
+  for (uint32_t index = 0; index < _length; ++index) {
+    const char16_t unit = units[index];
+    if (isHighSurrogate(unit) && index + 1 < _length && isLowSurrogate(units[index + 1])) {
+      appendUTF8(out, codePointAt(*this, index++));
+    } else if (isHighSurrogate(unit) || isLowSurrogate(unit)) {
+      appendUTF8(out, 0xFFFD);
+    } else {
+      appendUTF8(out, unit);
+    }
+  }
+}
+
+std::string NSStringView::utf8() const {
+  std::string out;
+  out.reserve(_length);
+  appendUTF8To(out);
+  return out;
+}
+
+std::u16string NSStringView::utf16() const {
+  return withUnits(*this, [&](auto* units) { return std::u16string(units, units + _length); });
+}
+
+}  // namespace xquery

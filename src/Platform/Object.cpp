@@ -1,0 +1,253 @@
+// The object allocator and the destruction of object graphs.
+//
+// Blocks of up to 128 bytes are kept in lists by size, 16 bytes apart. A thread works on two lists
+// of each size without any lock: the one in use and a full one in reserve. A thread that fills both
+// hands the full one to the process, and a thread that runs dry takes one from there before it
+// carves new blocks from a chunk; so one thread may for ever make what another frees without the
+// process growing.
+//
+//   free block   | next block of the list | next list (first block of a list of the process) | ...
+//
+// Chunks are never given back: memory that a large result needed once stays ready for the next one.
+// Under a sanitizer every block comes from malloc, so that it sees each of them.
+#include "xquery/Object.h"
+
+#include <algorithm>
+#include <cstdlib>
+#include <mutex>
+#include <new>
+
+namespace xquery {
+
+namespace {
+
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr bool usesFreeLists = false;
+#else
+constexpr bool usesFreeLists = true;
+#endif
+
+constexpr size_t granule = 16;
+constexpr size_t largestBlock = 128;
+constexpr size_t sizeCount = largestBlock / granule;
+constexpr size_t chunkBytes = size_t{64} * 1024;
+constexpr uint32_t listLength = 256;
+
+struct FreeBlock {
+  FreeBlock* next;
+  FreeBlock* nextList;
+};
+
+struct BlockList {
+  FreeBlock* first = nullptr;
+  uint32_t length = 0;
+  FreeBlock* reserve = nullptr;  // a list of `listLength` blocks, or null
+};
+
+// Objects whose destruction waits until the ones above them on the stack are done.
+struct PendingObjects {
+  const NSCounted** objects = nullptr;
+  size_t count = 0;
+  size_t capacity = 0;
+};
+
+// All that a thread keeps; needs no construction, so that reaching it is one instruction.
+struct ThreadState {
+  BlockList lists[sizeCount];
+  unsigned char* chunk = nullptr;  // what is left of the chunk being carved
+  size_t chunkLeft = 0;
+  bool closesAtExit = false;
+  uint32_t destructionDepth = 0;
+  PendingObjects pending;
+};
+
+constinit thread_local ThreadState threadState __attribute__((tls_model("initial-exec")));
+
+// What threads hand to each other: per size a stack of lists.
+struct SharedLists {
+  std::mutex mutex;
+  FreeBlock* lists[sizeCount] = {};
+  // Every chunk, chained through its first word, so that leak checkers find the memory in use.
+  void* chunks = nullptr;
+};
+
+SharedLists& sharedLists() {
+  // Never destroyed: objects may be released by destructors that run at exit.
+  alignas(SharedLists) static unsigned char storage[sizeof(SharedLists)];
+  static SharedLists* const shared = ::new (storage) SharedLists;
+  return *shared;
+}
+
+void giveList(size_t sizeIndex, FreeBlock* list) {
+  SharedLists& shared = sharedLists();
+  const std::lock_guard<std::mutex> guard(shared.mutex);
+  list->nextList = shared.lists[sizeIndex];
+  shared.lists[sizeIndex] = list;
+}
+
+FreeBlock* takeList(size_t sizeIndex) {
+  SharedLists& shared = sharedLists();
+  const std::lock_guard<std::mutex> guard(shared.mutex);
+  FreeBlock* list = shared.lists[sizeIndex];
+  if (list) shared.lists[sizeIndex] = list->nextList;
+  return list;
+}
+
+// Gives the next bytes of the chunk, a multiple of the granule, to the process as one block.
+void giveRemainder(size_t size) {
+  auto* block = reinterpret_cast<FreeBlock*>(threadState.chunk);
+  block->next = nullptr;
+  giveList(size / granule - 1, block);
+  threadState.chunk += size;
+  threadState.chunkLeft -= size;
+}
+
+// Gives everything a thread holds to the process when the thread ends.
+struct ThreadExit {
+  ~ThreadExit() {
+    for (size_t index = 0; index < sizeCount; ++index) {
+      BlockList& blocks = threadState.lists[index];
+      if (blocks.first) giveList(index, blocks.first);
+      if (blocks.reserve) giveList(index, blocks.reserve);
+      blocks = BlockList();
+    }
+    // The rest of the chunk becomes blocks of the largest size that fits.
+    while (threadState.chunkLeft >= granule) {
+      giveRemainder(std::min(threadState.chunkLeft, largestBlock));
+    }
+  }
+};
+
+void closeAtThreadExit() {
+  static thread_local ThreadExit threadExit;
+  static_cast<void>(&threadExit);
+  threadState.closesAtExit = true;
+}
+
+void startChunk() {
+  auto* chunk = static_cast<unsigned char*>(std::malloc(chunkBytes));
+  if (!chunk) throw std::bad_alloc();
+  SharedLists& shared = sharedLists();
+  const std::lock_guard<std::mutex> guard(shared.mutex);
+  *reinterpret_cast<void**>(chunk) = shared.chunks;
+  shared.chunks = chunk;
+  threadState.chunk = chunk + granule;
+  threadState.chunkLeft = chunkBytes - granule;
+}
+
+// Fills the empty list in use with some blocks from the chunk.
+void carveBlocks(size_t sizeIndex) {
+  constexpr uint32_t blocksAtOnce = 32;
+  const size_t size = (sizeIndex + 1) * granule;
+  ThreadState& state = threadState;
+  if (state.chunkLeft < size) {
+    // A remainder smaller than this block serves a smaller size.
+    if (state.chunkLeft >= granule) giveRemainder(state.chunkLeft);
+    startChunk();
+  }
+  BlockList& blocks = state.lists[sizeIndex];
+  blocks.length = 0;
+  while (blocks.length < blocksAtOnce && state.chunkLeft >= size) {
+    auto* block = reinterpret_cast<FreeBlock*>(state.chunk);
+    block->next = blocks.first;
+    blocks.first = block;
+    ++blocks.length;
+    state.chunk += size;
+    state.chunkLeft -= size;
+  }
+}
+
+// The list in use is empty.
+[[gnu::noinline]] void* allocateSlowly(size_t sizeIndex) {
+  ThreadState& state = threadState;
+  if (!state.closesAtExit) closeAtThreadExit();
+  BlockList& blocks = state.lists[sizeIndex];
+  FreeBlock* list = blocks.reserve ? std::exchange(blocks.reserve, nullptr) : takeList(sizeIndex);
+  if (list) {
+    blocks.first = list->next;
+    // A list left by a thread that ended may be shorter; the length only paces the exchange.
+    blocks.length = listLength - 1;
+    return list;
+  }
+  carveBlocks(sizeIndex);
+  FreeBlock* block = blocks.first;
+  blocks.first = block->next;
+  --blocks.length;
+  return block;
+}
+
+// The list in use is full or empty.
+[[gnu::noinline]] void prepareToFree(size_t sizeIndex) {
+  ThreadState& state = threadState;
+  if (!state.closesAtExit) closeAtThreadExit();
+  BlockList& blocks = state.lists[sizeIndex];
+  if (!blocks.first) {
+    blocks.length = 0;
+    return;
+  }
+  if (blocks.reserve) giveList(sizeIndex, blocks.reserve);
+  blocks.reserve = std::exchange(blocks.first, nullptr);
+  blocks.length = 0;
+}
+
+bool pushPending(const NSCounted* object) {
+  PendingObjects& pending = threadState.pending;
+  if (pending.count == pending.capacity) {
+    const size_t capacity = pending.capacity ? pending.capacity * 2 : 64;
+    void* objects = std::realloc(pending.objects, capacity * sizeof(*pending.objects));
+    if (!objects) return false;
+    pending.objects = static_cast<const NSCounted**>(objects);
+    pending.capacity = capacity;
+  }
+  pending.objects[pending.count++] = object;
+  return true;
+}
+
+}  // namespace
+
+void* NSCounted::operator new(size_t size) {
+  if (!usesFreeLists || size > largestBlock) return ::operator new(size);
+  const size_t sizeIndex = (size - 1) / granule;
+  BlockList& blocks = threadState.lists[sizeIndex];
+  FreeBlock* block = blocks.first;
+  if (!block) [[unlikely]] {
+    return allocateSlowly(sizeIndex);
+  }
+  blocks.first = block->next;
+  --blocks.length;
+  return block;
+}
+
+void NSCounted::operator delete(void* block, size_t size) noexcept {
+  if (!usesFreeLists || size > largestBlock) {
+    ::operator delete(block, size);
+    return;
+  }
+  const size_t sizeIndex = (size - 1) / granule;
+  BlockList& blocks = threadState.lists[sizeIndex];
+  if (!blocks.first || blocks.length >= listLength) [[unlikely]] {
+    prepareToFree(sizeIndex);
+  }
+  auto* freed = static_cast<FreeBlock*>(block);
+  freed->next = blocks.first;
+  blocks.first = freed;
+  ++blocks.length;
+}
+
+void NSCounted::destroy(const NSCounted* object) {
+  // A nested destruction takes a few hundred bytes of stack, so this depth is safe everywhere.
+  constexpr uint32_t maximumDepth = 64;
+  ThreadState& state = threadState;
+  if (state.destructionDepth >= maximumDepth && pushPending(object)) return;
+  ++state.destructionDepth;
+  delete object;
+  if (state.destructionDepth == 1 && state.pending.count) [[unlikely]] {
+    PendingObjects& pending = state.pending;
+    while (pending.count) delete pending.objects[--pending.count];
+    std::free(pending.objects);
+    pending = PendingObjects();
+  }
+  --state.destructionDepth;
+}
+
+}  // namespace xquery
