@@ -1,0 +1,189 @@
+// The exported classes: thin shells over their private objects, and the evaluation driver.
+#include "xquery/XQuery.h"
+
+#include <new>
+#include <stdexcept>
+
+#include "Eval/XQueryContextInternal.h"
+#include "Eval/XQueryInternal.h"
+#include "Expr/XQuerySequence.h"
+#include "Platform/NSLog.h"
+#include "Prolog/XQueryDeclarations.h"
+#include "Prolog/XQueryProlog.h"
+#include "Types/XQueryValues.h"
+#include "xquery/XMLNode.h"
+
+namespace xquery {
+
+Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source) {
+  return make<XQuery>(std::make_unique<XQueryInternal>(source));
+}
+
+Ref<XQuery> XQuery::xqueryWithSource(std::string_view source) {
+  if (const auto text = NSString::stringWithUTF8(source)) return xqueryWithSource(text);
+  return make<XQuery>(std::make_unique<XQueryInternal>(
+      XQueryError::error(3, "the query is not well-formed UTF-8")));
+}
+
+XQuery::XQuery(std::unique_ptr<XQueryInternal> internal)
+    : NSCounted(Kind::Query), _private(std::move(internal)) {}
+
+XQuery::~XQuery() = default;
+
+Ref<NSArray> XQuery::parseErrors() const {
+  if (!_private->isError()) return {};
+  const auto& errors = _private->errors();
+  return NSArray::arrayWithObjects(std::vector<Value>(errors.begin(), errors.end()));
+}
+
+Ref<XQueryContext> XQueryContext::xqueryContext() { return make<XQueryContext>(); }
+
+Ref<XQueryContext> XQueryContext::xqueryContextWithNamespaces(
+    const std::map<std::string, std::string>& namespaces) {
+  auto context = xqueryContext();
+  for (const auto& [prefix, URI] : namespaces) {
+    const auto prefixString = NSString::stringWithUTF8(prefix);
+    const auto URIString = NSString::stringWithUTF8(URI);
+    if (prefixString && URIString) context->_internal().addNamespace(URIString, prefixString);
+  }
+  return context;
+}
+
+XQueryContext::XQueryContext()
+    : NSCounted(Kind::Context), _private(std::make_unique<XQueryContextInternal>()) {}
+
+XQueryContext::~XQueryContext() = default;
+
+void XQueryContext::addXQueryProlog(const Value&) {}
+
+void XQueryContext::contextSetClient(std::shared_ptr<XQueryClient> client) {
+  _private->setClient(std::move(client));
+}
+
+std::shared_ptr<XQueryClient> XQueryContext::contextClient() const { return _private->client(); }
+
+void XQueryContext::contextAddClientSelector(std::string_view, std::string_view) {}
+
+void XQueryContext::_traceValue(const Value& value, const Ref<NSString>& forLabel) {
+  if (const auto client = _private->client()) {
+    client->XQueryClientTraceValue(value, forLabel, *this);
+  } else if (XQueryLogEnabled()) {
+    NSLog(XQueryDescription(forLabel.get())->utf8() + " " +
+          XQueryDescription(value.get())->utf8());
+  }
+}
+
+namespace {
+
+// Names a constant or declaration in a message: error 16, unresloved (so spelled) external.
+[[noreturn]] void raiseUnresolved(XQueryContextInternal& context, std::string_view kind,
+                                  const XQueryQName& name) {
+  std::string message = "unresloved external ";
+  message += kind;
+  message += " - ";
+  message += name.XQueryStringValue()->utf8();
+  context.raise(XQueryError::error(16, message));
+}
+
+void setConstants(const XQueryConstants& constants, const XQueryProlog& prolog,
+                  XQueryContextInternal& context) {
+  for (const auto& [name, value] : constants) {
+    const auto text = NSString::stringWithUTF8(name);
+    if (!text || !value) continue;
+    if (const auto qName = prolog.variableQNameFromString(text)) context.setGlobal(value, qName);
+  }
+}
+
+void evaluateVariable(const XQueryVarDecl& declaration, XQueryContext& publicContext) {
+  auto& context = publicContext._internal();
+  if (declaration.isExternal()) {
+    if (!context.globalForQName(*declaration.name())) {
+      raiseUnresolved(context, "variable", *declaration.name());
+    }
+    return;
+  }
+  // The initializer sees the static context of the module that declared it.
+  XQueryProlog* const prolog = context.activeProlog();
+  const bool ordered = context.ordered();
+  context.setActiveProlog(&declaration.prolog());
+  context.setOrdered(declaration.prolog().ordered());
+  const Value value = declaration.expr()->evaluateWithContext(publicContext);
+  context.setActiveProlog(prolog);
+  context.setOrdered(ordered);
+  if (!value) raiseUnresolved(context, "variable", *declaration.name());
+  context.setGlobal(value, declaration.name());
+}
+
+void evaluateDeclarations(const XQueryProlog& prolog, XQueryContext& context) {
+  for (const Value& declaration : prolog.declarations()) {
+    if (const auto* variable = dyn_cast<XQueryVarDecl>(declaration)) {
+      evaluateVariable(*variable, context);
+    } else if (const auto* function = dyn_cast<XQueryFunctionDecl>(declaration)) {
+      if (function->isExternal() &&
+          !context._internal().XQueryExternalFunctionForQName(*function->name())) {
+        raiseUnresolved(context._internal(), "function", *function->name());
+      }
+    }
+  }
+}
+
+// Marks the first result with the base URI that its construction recorded.
+void decorateWithBaseURI(const NSArray& items, const XQueryContextInternal& context) {
+  NSObject* first = items.objectAtIndex(0);
+  if (const auto* document = dyn_cast<NSXMLDocument>(first)) first = document->rootElement();
+  auto* element = dyn_cast<NSXMLElement>(first);
+  if (!element) return;
+  const NSStringView name = NSStringView::ascii("xml:base");
+  const Ref<NSString> URI = context.baseURIForNode(element);
+  const bool isEmpty = !URI || URI->length() == 0;
+  if (isEmpty && element->attributeForName(name)) return;
+  element->addAttribute(
+      NSXMLNode::attributeWithName(name, URI ? URI->view() : NSStringView(),
+                                   NSStringView::ascii("http://www.w3.org/XML/1998/namespace")));
+}
+
+}  // namespace
+
+Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryConstants& constants,
+                                           const Value& contextItem, Ref<XQueryError>* error) {
+  const XQueryInternal& compiled = query._internal();
+  auto& context = *_private;
+  if (error) *error = nullptr;
+  if (compiled.isError()) return shapedResult(query.parseErrors(), error);
+
+  context._clearGlobals();
+  if (contextItem && !isNull(contextItem)) context.setContextItem(contextItem, 1);
+  XQueryProlog& prolog = *compiled.prolog();
+  context.setOrdered(prolog.ordered());
+  context.setActiveProlog(&prolog);
+  Value result;
+  try {
+    setConstants(constants, prolog, context);
+    evaluateDeclarations(prolog, *this);
+    if (compiled.body()) result = compiled.body()->evaluateWithContext(*this);
+  } catch (const NSException&) {
+    result = context.error();
+  } catch (const std::bad_alloc&) {
+    result = XQueryError::error(0, "limit: out of memory");
+  } catch (const std::length_error&) {
+    result = XQueryError::error(0, "limit: out of memory");
+  }
+  context._clearGlobals();
+  return shapedResult(result, error);
+}
+
+Ref<NSArray> XQueryContext::shapedResult(const Value& result, Ref<XQueryError>* error) {
+  if (!result) return {};
+  Ref<NSArray> items = dyn_cast<NSArray>(result);
+  if (!items) items = NSArray::arrayWithObjects({result});
+  if (items->count() == 0) return items;
+  if (auto* failure = dyn_cast<XQueryError>(items->objectAtIndex(0))) {
+    if (error) *error = failure;
+    return {};
+  }
+  if (items->count() == 1 && isNull(items->objects().front())) return NSArray::array();
+  if (_private->baseURINodeCount() > 0) decorateWithBaseURI(*items, *_private);
+  return items;
+}
+
+}  // namespace xquery

@@ -1,0 +1,129 @@
+#include "Eval/XQueryContextInternal.h"
+
+#include "Platform/NSLog.h"
+#include "Prolog/XQueryProlog.h"
+#include "Types/XQueryNodeFunctions.h"
+#include "xquery/Collection.h"
+
+namespace xquery {
+
+XQueryContextInternal::XQueryContextInternal() : _variables(std::make_shared<XQueryFrame>()) {}
+
+XQueryContextInternal::~XQueryContextInternal() = default;
+
+NSObject* XQueryContextInternal::variableForID(int64_t varID) const {
+  if (varID < 1 || !_variables || static_cast<size_t>(varID) >= _variables->size()) return nullptr;
+  return (*_variables)[static_cast<size_t>(varID)].get();
+}
+
+void XQueryContextInternal::setVariable(const Value& value, int64_t forID) {
+  if (!_variables) _variables = std::make_shared<XQueryFrame>();
+  if (forID < 1) return;
+  const auto index = static_cast<size_t>(forID);
+  while (_variables->size() <= index) _variables->push_back(NSNull::null());
+  (*_variables)[index] = value;
+}
+
+NSObject* XQueryContextInternal::globalForQName(const XQueryQName& qName) const {
+  const auto found = _globals.find(Ref<XQueryQName>(const_cast<XQueryQName*>(&qName)));
+  return found == _globals.end() ? nullptr : found->second.get();
+}
+
+void XQueryContextInternal::setGlobal(const Value& value, const Ref<XQueryQName>& forQName) {
+  _globals[forQName] = value;
+}
+
+void XQueryContextInternal::_clearGlobals() { _globals.clear(); }
+
+Ref<NSString> XQueryContextInternal::namespaceForPrefix(NSStringView prefix) const {
+  return _prolog ? _prolog->namespaceForPrefix(prefix) : Ref<NSString>();
+}
+
+Ref<NSString> XQueryContextInternal::namespaceForPrefix(NSStringView prefix,
+                                                        bool& fromProlog) const {
+  return _prolog ? _prolog->namespaceForPrefix(prefix, fromProlog) : Ref<NSString>();
+}
+
+Ref<NSString> XQueryContextInternal::defaultElementNamespace() const {
+  return _prolog ? _prolog->defaultElementNamespace() : Ref<NSString>();
+}
+
+Ref<NSString> XQueryContextInternal::defaultCollation() const {
+  return _prolog ? _prolog->defaultCollation() : Ref<NSString>();
+}
+
+Ref<NSString> XQueryContextInternal::baseURI() const {
+  return _prolog ? _prolog->baseURI() : Ref<NSString>();
+}
+
+bool XQueryContextInternal::xmlSpacePreserve() const {
+  return _prolog && _prolog->xmlSpacePreserve();
+}
+
+void XQueryContextInternal::pushInScopeNamespaces(std::vector<Ref<NSXMLNode>> namespaces) {
+  _inScopeNamespaces.push_back(std::move(namespaces));
+}
+
+void XQueryContextInternal::popInScopeNamespaces() {
+  if (!_inScopeNamespaces.empty()) _inScopeNamespaces.pop_back();
+}
+
+Ref<NSString> XQueryContextInternal::firstPrefixForNamespace(const Ref<NSString>& URI) const {
+  for (auto entry = _inScopeNamespaces.rbegin(); entry != _inScopeNamespaces.rend(); ++entry) {
+    for (const auto& node : *entry) {
+      if (node->textView() == URI->view()) return node->name();
+    }
+  }
+  if (!_prolog) return {};
+  const Value prefixes = _prolog->prefixesForID(_prolog->namespaceID(URI));
+  if (const auto* several = dyn_cast<NSArray>(prefixes)) {
+    return several->count() ? cast<NSString>(several->objects().back()) : nullptr;
+  }
+  return dyn_cast<NSString>(prefixes);
+}
+
+Ref<NSString> XQueryContextInternal::contextNamespaceForPrefix(NSStringView prefix) const {
+  const auto found = _contextNamespaces.find(prefix.utf8());
+  return found == _contextNamespaces.end() ? Ref<NSString>() : found->second;
+}
+
+void XQueryContextInternal::addNamespace(const Ref<NSString>& URI, const Ref<NSString>& forPrefix) {
+  if (URI) {
+    _contextNamespaces[forPrefix->utf8()] = URI;
+  } else {
+    _contextNamespaces.erase(forPrefix->utf8());
+  }
+}
+
+void XQueryContextInternal::setBaseURI(const Ref<NSString>& URI, const NSXMLNode* forNode) {
+  if (URI && forNode) _baseURINodes[forNode] = URI;
+}
+
+Ref<NSString> XQueryContextInternal::baseURIForNode(const NSXMLNode* node) const {
+  if (!node) return {};
+  Ref<NSString> own = XQueryNodeBaseURI(node);
+  if ((own && own->length() > 0) || _baseURINodes.empty()) return own;
+  const auto found = _baseURINodes.find(node);
+  return found == _baseURINodes.end() ? Ref<NSString>() : found->second;
+}
+
+void XQueryContextInternal::setError(Ref<XQueryError> error, bool raiseException) {
+  _error = std::move(error);
+  if (!raiseException) return;
+  const Ref<NSString> reason = _error ? _error->description() : Ref<NSString>();
+  if (!XQueryLogEnabled()) throw NSException("XQueryError", reason);
+  // With diagnostics on the failure goes through the assertion handler, which logs and throws.
+  NSLog("*** Assertion failure in -[XQueryContextInternal setError:raiseException:], "
+        "Eval/XQueryContextInternal:288: " +
+        (reason ? reason->utf8() : std::string("(null)")));
+  throw NSException("NSInternalInconsistencyException", reason);
+}
+
+void XQueryContextInternal::raise(Ref<XQueryError> error) {
+  setError(std::move(error), true);
+  __builtin_unreachable();
+}
+
+Value XQueryContextInternal::XQueryExternalFunctionForQName(const XQueryQName&) const { return {}; }
+
+}  // namespace xquery

@@ -1,0 +1,274 @@
+#include "Expr/XQueryLeaves.h"
+
+#include <gtest/gtest.h>
+
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryLists.h"
+#include "Expr/XQuerySequence.h"
+#include "Prolog/XQueryProlog.h"
+#include "Types/XQueryNumber.h"
+#include "Types/XQueryTypeTable.h"
+#include "Types/XQueryValues.h"
+
+namespace xquery {
+namespace {
+
+Ref<NSString> text(std::string_view ascii) { return NSString::stringWithASCII(ascii); }
+Ref<XQueryExpr> integer(std::string_view digits) {
+  return XQueryLiteral::integerLiteralWithString(text(digits));
+}
+Ref<XQueryExpr> emptyLiteral() { return XQueryLiteral::literalWithValue(NSNull::null()); }
+std::string printed(const Value& value) { return XQueryStringValue(*value)->utf8(); }
+
+class Leaves : public testing::Test {
+ protected:
+  Value evaluate(const XQueryExpr& expr) { return expr.evaluateWithContext(*context); }
+  XQueryContextInternal& dynamic() { return context->_internal(); }
+  // The error that evaluating raises.
+  Ref<XQueryError> failure(const XQueryExpr& expr) {
+    try {
+      evaluate(expr);
+    } catch (const NSException& exception) {
+      EXPECT_EQ(exception.name(), "XQueryError");
+      EXPECT_EQ(exception.reason()->utf8(), dynamic().error()->description()->utf8());
+      return dynamic().error();
+    }
+    return {};
+  }
+  Ref<XQueryContext> context = XQueryContext::xqueryContext();
+  Ref<XQueryProlog> prolog = XQueryProlog::prologWithItems({}, nullptr, nullptr, nullptr);
+};
+
+TEST_F(Leaves, LiteralAnswersTheSameObjectEveryTime) {
+  const auto literal = integer("5");
+  EXPECT_EQ(evaluate(*literal).get(), evaluate(*literal).get());
+  EXPECT_EQ(XQueryObjectTypeID(evaluate(*literal).get()), XQueryTypeInteger);
+}
+
+TEST_F(Leaves, IntegerLiteralHasNoMachineWordLimit) {
+  EXPECT_EQ(printed(evaluate(*integer("123456789012345678901234567890"))),
+            "123456789012345678901234567890");
+}
+
+TEST_F(Leaves, DecimalLiteralIsADecimal) {
+  const auto value = evaluate(*XQueryLiteral::decimalLiteralWithString(text("1.50")));
+  EXPECT_EQ(XQueryObjectTypeID(value.get()), XQueryTypeDecimal);
+  EXPECT_EQ(printed(value), "1.5");
+}
+
+TEST_F(Leaves, StringLiteralIsAString) {
+  const auto value = evaluate(*XQueryLiteral::stringLiteralWithString(text("hi")));
+  EXPECT_EQ(XQueryObjectTypeID(value.get()), XQueryTypeString);
+  EXPECT_EQ(printed(value), "hi");
+}
+
+TEST_F(Leaves, DoubleLiteralIsADouble) {
+  const auto value = evaluate(*XQueryLiteral::doubleLiteralWithString(text("1.5e3")));
+  EXPECT_EQ(XQueryObjectTypeID(value.get()), XQueryTypeDouble);
+  EXPECT_EQ(printed(value), "1500");
+}
+
+TEST_F(Leaves, DoubleLiteralThatOverflowsIsTheSharedInfinity) {
+  const auto value = evaluate(*XQueryLiteral::doubleLiteralWithString(text("1e400")));
+  EXPECT_EQ(value.get(), XQueryNumber::posInf());
+}
+
+TEST_F(Leaves, LiteralDescribesItself) {
+  EXPECT_EQ(integer("7")->description()->utf8(), "<XQueryLiteral - 7>");
+}
+
+TEST_F(Leaves, EmptyListEvaluatesToNull) {
+  EXPECT_TRUE(isNull(evaluate(*XQueryExprList::exprList())));
+}
+
+TEST_F(Leaves, ListOfTwoEmptyExpressionsIsNull) {
+  auto list = XQueryExprList::exprList();
+  list->addObject(emptyLiteral());
+  list->addObject(emptyLiteral());
+  EXPECT_TRUE(isNull(evaluate(*list)));
+}
+
+TEST_F(Leaves, ListOfAnItemAndAnEmptyExpressionIsTheItem) {
+  auto list = XQueryExprList::exprList();
+  list->addObject(integer("1"));
+  list->addObject(emptyLiteral());
+  EXPECT_EQ(printed(evaluate(*list)), "1");
+}
+
+TEST_F(Leaves, ListFlattensToOneSequence) {
+  auto inner = XQueryExprList::exprList();
+  inner->addObject(integer("2"));
+  inner->addObject(integer("3"));
+  auto list = XQueryExprList::exprList();
+  list->addObject(integer("1"));
+  list->addObject(inner);
+  list->addObject(integer("4"));
+  const Value value = evaluate(*list);
+  ASSERT_TRUE(isa<NSArray>(value));
+  std::string all;
+  for (const Value& item : cast<NSArray>(value)->objects()) all += printed(item);
+  EXPECT_EQ(all, "1234");
+}
+
+TEST_F(Leaves, ListWhoseOnlyElementYieldsAOneElementArrayAnswersThatElement) {
+  const Value item = text("x");
+  auto list = XQueryExprList::exprList();
+  list->addObject(XQueryLiteral::literalWithValue(NSArray::arrayWithObjects({item})));
+  EXPECT_EQ(evaluate(*list).get(), item.get());
+}
+
+TEST_F(Leaves, AddingNoExpressionStoresAnEmptyLiteral) {
+  auto list = XQueryExprList::exprList();
+  list->addObject(nullptr);
+  ASSERT_EQ(list->count(), 1U);
+  ASSERT_TRUE(isa<XQueryLiteral>(list->objectAtIndex(0)));
+  EXPECT_TRUE(isNull(evaluate(*list)));
+}
+
+TEST_F(Leaves, InsertingIntoAListOfOneLeavesTheElementInItTwice) {
+  auto list = XQueryExprList::exprList();
+  auto first = integer("1");
+  auto second = integer("2");
+  list->addObject(first);
+  list->insertObject(second, 0);
+  ASSERT_EQ(list->count(), 3U);
+  EXPECT_EQ(list->objectAtIndex(0), second.get());
+  EXPECT_EQ(list->objectAtIndex(1), first.get());
+  EXPECT_EQ(list->objectAtIndex(2), second.get());
+}
+
+TEST_F(Leaves, InsertingIntoAnEmptyListDoesNothing) {
+  auto list = XQueryExprList::exprList();
+  list->insertObject(integer("1"), 0);
+  EXPECT_EQ(list->count(), 0U);
+}
+
+TEST_F(Leaves, InsertingIntoALongerListInsertsOnce) {
+  auto list = XQueryExprList::exprList();
+  for (const char* digits : {"1", "2", "3"}) list->addObject(integer(digits));
+  auto inserted = integer("9");
+  list->insertObject(inserted, 1);
+  ASSERT_EQ(list->count(), 4U);
+  EXPECT_EQ(list->objectAtIndex(1), inserted.get());
+}
+
+TEST_F(Leaves, ListRemovesAndReplacesItsSingleElement) {
+  auto list = XQueryExprList::exprList();
+  list->addObject(integer("1"));
+  auto other = integer("2");
+  list->replaceObjectAtIndex(0, other);
+  EXPECT_EQ(list->objectAtIndex(0), other.get());
+  EXPECT_EQ(list->objectAtIndex(1), nullptr);
+  list->removeObjectAtIndex(0);
+  EXPECT_EQ(list->count(), 0U);
+  list->addObject(integer("3"));
+  list->removeLastObject();
+  EXPECT_EQ(list->count(), 0U);
+}
+
+TEST_F(Leaves, ArgumentsKeepOneEntryEach) {
+  auto pair = XQueryExprList::exprList();
+  pair->addObject(integer("1"));
+  pair->addObject(integer("2"));
+  auto args = XQueryArgs::args();
+  args->addObject(pair);
+  args->addObject(emptyLiteral());
+  args->addObject(integer("3"));
+  const Value value = evaluate(*args);
+  ASSERT_TRUE(isa<NSArray>(value));
+  const auto& entries = cast<NSArray>(value)->objects();
+  ASSERT_EQ(entries.size(), 3U);
+  EXPECT_TRUE(isa<NSArray>(entries[0]));
+  EXPECT_TRUE(isNull(entries[1]));
+  EXPECT_EQ(printed(entries[2]), "3");
+}
+
+TEST_F(Leaves, LocalVariableAnswersItsSlotAsStored) {
+  const auto qName = XQueryQName::qname(text("x"), nullptr);
+  const int64_t id = prolog->newLocalVariableIDForQName(qName);
+  auto variable = XQueryVariable::variableWithName(text("x"));
+  variable->bindInfoForProlog(*prolog);
+  EXPECT_EQ(variable->varID(), id);
+  const Value array = NSArray::arrayWithObjects({text("a")});
+  dynamic().setVariable(array, id);
+  EXPECT_EQ(evaluate(*variable).get(), array.get());
+}
+
+TEST_F(Leaves, GlobalVariableIsFoundByName) {
+  auto variable = XQueryVariable::variableWithName(text("g"));
+  variable->bindInfoForProlog(*prolog);
+  EXPECT_EQ(variable->varID(), 0);
+  const Value value = text("v");
+  dynamic().setGlobal(value, XQueryQName::qname(text("g"), nullptr));
+  EXPECT_EQ(evaluate(*variable).get(), value.get());
+}
+
+TEST_F(Leaves, EmptyLocalSlotIsNeverLookedUpAmongTheGlobals) {
+  const auto qName = XQueryQName::qname(text("x"), nullptr);
+  prolog->newLocalVariableIDForQName(qName);
+  auto variable = XQueryVariable::variableWithName(text("x"));
+  variable->bindInfoForProlog(*prolog);
+  variable->setExprLine(4);
+  dynamic().setGlobal(text("global"), qName);
+  const auto error = failure(*variable);
+  ASSERT_TRUE(error);
+  EXPECT_EQ(error->err(), 8);
+  EXPECT_EQ(error->msg()->utf8(), "reference to undefined variable \"x\"");
+  EXPECT_EQ(error->line(), 5);
+}
+
+TEST_F(Leaves, UndefinedVariableIsNamedAsWritten) {
+  auto variable = XQueryVariable::variableWithName(text("nowhere:x"));
+  variable->bindInfoForProlog(*prolog);
+  const auto error = failure(*variable);
+  ASSERT_TRUE(error);
+  EXPECT_EQ(error->msg()->utf8(), "reference to undefined variable \"nowhere:x\"");
+}
+
+TEST_F(Leaves, ContextItemIsOneSharedExpression) {
+  EXPECT_EQ(XQueryContextItem::contextItem(), XQueryContextItem::contextItem());
+  EXPECT_FALSE(evaluate(*XQueryContextItem::contextItem()));
+  const Value item = text("i");
+  dynamic().setContextItem(item, 3);
+  EXPECT_EQ(evaluate(*XQueryContextItem::contextItem()).get(), item.get());
+}
+
+TEST_F(Leaves, ResolvedQNameReferenceAnswersItsName) {
+  const auto qName = XQueryQName::qname(text("p:a"), text("u"));
+  const auto reference = XQueryQNameReference::qNameReferenceWithQName(qName, 2);
+  EXPECT_EQ(evaluate(*reference).get(), qName.get());
+  EXPECT_EQ(reference->exprLine(), 2);
+}
+
+TEST_F(Leaves, QNameReferenceResolvesInTheContextsNamespacesWithoutPrefix) {
+  dynamic().addNamespace(text("urn:p"), text("p"));
+  const Value value = evaluate(*XQueryQNameReference::qNameReferenceWithString(text("p:a"), 0));
+  const auto* qName = dyn_cast<XQueryQName>(value);
+  ASSERT_TRUE(qName);
+  EXPECT_EQ(qName->namespaceURI()->utf8(), "urn:p");
+  EXPECT_EQ(qName->localPart()->utf8(), "a");
+  EXPECT_EQ(qName->XQueryStringValue()->utf8(), "a");
+}
+
+TEST_F(Leaves, QNameReferenceWithoutPrefixHasNoNamespace) {
+  const Value value = evaluate(*XQueryQNameReference::qNameReferenceWithString(text("a"), 0));
+  const auto* qName = dyn_cast<XQueryQName>(value);
+  ASSERT_TRUE(qName);
+  EXPECT_FALSE(qName->namespaceURI());
+}
+
+TEST_F(Leaves, UnknownPrefixRaisesWithTheNameAndLine) {
+  const auto error = failure(*XQueryQNameReference::qNameReferenceWithString(text("q:a"), 6));
+  ASSERT_TRUE(error);
+  EXPECT_EQ(error->err(), 1);
+  EXPECT_EQ(error->msg()->utf8(), "can't resolve QName for \"q:a\"");
+  EXPECT_EQ(error->line(), 7);
+}
+
+TEST_F(Leaves, EmptyLocalPartRaises) {
+  dynamic().addNamespace(text("urn:p"), text("p"));
+  EXPECT_TRUE(failure(*XQueryQNameReference::qNameReferenceWithString(text("p:"), 0)));
+}
+
+}  // namespace
+}  // namespace xquery

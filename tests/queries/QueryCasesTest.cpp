@@ -1,0 +1,179 @@
+// Runs the whole-query cases under tests/queries/cases. A file holds any number of cases:
+//
+//   == what the case shows
+//   -- var n=5                      (optional, repeatable: an untyped atomic external variable)
+//   -- namespace p=urn:p            (optional, repeatable: a context namespace)
+//   -- xml                          (optional: the context document, to the next section)
+//   <a><b/></a>
+//   -- query
+//   //b
+//   -- result                       (one line per item: type, tab, text as the command prints it)
+//   element()	<b/>
+//   -- error 6 line 1 invalid type for operator     (instead of a result; "line N" is optional)
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cctype>
+#include <filesystem>
+#include <fstream>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "xquery/xquery.h"
+
+namespace xquery {
+namespace {
+
+struct Case {
+  std::string name;
+  std::string file;
+  int line = 0;
+  XQueryConstants constants;
+  std::map<std::string, std::string> namespaces;
+  std::string xml;
+  std::string query;
+  std::vector<std::string> result;
+  std::string error;  // empty when a result is expected
+};
+
+// `text` up to the first `separator`, which is dropped with it.
+std::string takeUpTo(std::string& text, char separator) {
+  const size_t at = text.find(separator);
+  std::string head = text.substr(0, at);
+  text = at == std::string::npos ? "" : text.substr(at + 1);
+  return head;
+}
+
+void readHeader(Case& c, std::string header, std::string& section) {
+  section = takeUpTo(header, ' ');
+  if (section == "var") {
+    const std::string name = takeUpTo(header, '=');
+    c.constants[name] = XQueryUntypedAtomic(header);
+  } else if (section == "namespace") {
+    const std::string prefix = takeUpTo(header, '=');
+    c.namespaces[prefix] = header;
+  } else if (section == "error") {
+    c.error = header;
+  }
+}
+
+std::vector<Case> readCases(const std::filesystem::path& path) {
+  std::ifstream in(path);
+  std::vector<Case> cases;
+  std::string line, section;
+  for (int number = 1; std::getline(in, line); ++number) {
+    if (line.rfind("== ", 0) == 0) {
+      cases.emplace_back();
+      cases.back().name = line.substr(3);
+      cases.back().file = path.filename().string();
+      cases.back().line = number;
+      section.clear();
+    } else if (line.rfind("-- ", 0) == 0) {
+      readHeader(cases.back(), line.substr(3), section);
+    } else if (section == "xml") {
+      cases.back().xml += line + "\n";
+    } else if (section == "query") {
+      cases.back().query += line + "\n";
+    } else if (section == "result" && !line.empty()) {
+      cases.back().result.push_back(line);
+    }
+  }
+  return cases;
+}
+
+std::string printed(const NSObject& item) {
+  std::string text = XQueryItemTypeName(item) + "\t";
+  if (const auto* node = dyn_cast<NSXMLNode>(&item)) {
+    node->appendXMLTo(text);
+  } else {
+    text += XQueryItemStringValue(item);
+  }
+  return text;
+}
+
+// "6 line 1 message", as the cases write errors.
+std::string printedError(const XQueryError& error, bool withLine) {
+  std::string text = std::to_string(error.err());
+  if (withLine) text += " line " + std::to_string(error.line());
+  return text + " " + (error.msg() ? error.msg()->utf8() : "");
+}
+
+class QueryCase : public testing::Test {
+ public:
+  explicit QueryCase(Case c) : _case(std::move(c)) {}
+
+  void TestBody() override {
+    Value document;
+    if (!_case.xml.empty()) {
+      NSXMLParseError failure;
+      document = NSXMLDocument::documentWithData(_case.xml, NSXMLNodePreserveWhitespace, &failure);
+      ASSERT_TRUE(document) << failure.message;
+    }
+    // The last line break belongs to the file, not to the query.
+    const auto query = XQuery::xqueryWithSource(
+        std::string_view(_case.query).substr(0, _case.query.empty() ? 0 : _case.query.size() - 1));
+    const auto context = XQueryContext::xqueryContextWithNamespaces(_case.namespaces);
+    Ref<XQueryError> error;
+    const auto items = context->evaluateXQuery(*query, _case.constants, document, &error);
+    if (!_case.error.empty()) {
+      ASSERT_TRUE(error) << _case.file << ":" << _case.line << " expected an error";
+      const bool withLine = _case.error.find(" line ") != std::string::npos;
+      EXPECT_EQ(printedError(*error, withLine), _case.error) << _case.file << ":" << _case.line;
+      return;
+    }
+    ASSERT_FALSE(error) << _case.file << ":" << _case.line << " "
+                        << error->description()->utf8();
+    std::vector<std::string> lines;
+    if (items) {
+      for (const Value& item : items->objects()) lines.push_back(printed(*item));
+    }
+    EXPECT_EQ(lines, _case.result) << _case.file << ":" << _case.line;
+  }
+
+ private:
+  Case _case;
+};
+
+// A test name has letters and digits only.
+std::string identifier(const std::string& text) {
+  std::string name;
+  bool upper = true;
+  for (const char c : text) {
+    if (std::isalnum(static_cast<unsigned char>(c))) {
+      name += upper ? static_cast<char>(std::toupper(static_cast<unsigned char>(c))) : c;
+      upper = false;
+    } else {
+      upper = true;
+    }
+  }
+  return name;
+}
+
+void registerCases(const std::filesystem::path& folder) {
+  std::vector<std::filesystem::path> files;
+  for (const auto& entry : std::filesystem::directory_iterator(folder)) {
+    if (entry.path().extension() == ".cases") files.push_back(entry.path());
+  }
+  std::sort(files.begin(), files.end());
+  for (const auto& file : files) {
+    const std::string suite = "Query" + identifier(file.stem().string());
+    std::map<std::string, int> seen;
+    for (const Case& c : readCases(file)) {
+      std::string name = identifier(c.name);
+      if (const int again = seen[name]++) name += "Again" + std::to_string(again);
+      testing::RegisterTest(suite.c_str(), name.c_str(), nullptr, nullptr, file.c_str(), c.line,
+                            [c]() -> testing::Test* { return new QueryCase(c); });
+    }
+  }
+}
+
+const bool registered = [] {
+  registerCases(std::filesystem::path(__FILE__).parent_path() / "cases");
+  return true;
+}();
+
+TEST(QueryCases, AreRead) { EXPECT_TRUE(registered); }
+
+}  // namespace
+}  // namespace xquery
