@@ -4,7 +4,9 @@
 
 #include <cstdlib>
 
+#include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
+#include "Prolog/XQueryPrologItems.h"
 #include "xquery/Collection.h"
 
 namespace xquery {

@@ -9,7 +9,9 @@
 #include "Eval/XQueryInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
+#include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
+#include "Prolog/XQueryPrologItems.h"
 #include "xquery/XMLNode.h"
 
 namespace xquery {
