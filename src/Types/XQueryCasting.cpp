@@ -1,0 +1,459 @@
+// Casting, as a table: the class of the source against the primitive type of the target, one small
+// function per entry. An entry answers null for a value that does not fit and an absent entry is a
+// pair that cannot be cast at all; both end in the same error. The list types are in no entry:
+// nothing can be cast to them.
+#include "Types/XQueryCasting.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Types/XQueryAtomization.h"
+#include "Types/XQueryBinary.h"
+#include "Types/XQueryNotation.h"
+#include "Types/XQueryNumber.h"
+#include "Types/XQueryQName.h"
+#include "Types/XQueryString.h"
+#include "Types/XQueryValues.h"
+#include "xquery/Collection.h"
+#include "xquery/URL.h"
+#include "xquery/XQuery.h"
+
+#include <array>
+
+namespace xquery {
+
+namespace {
+
+struct Cast {
+  const Value& object;
+  XQueryTypeID target;
+  XQueryContext& context;
+
+  const NSString& string() const { return *cast<NSString>(object); }
+  const NSNumber& number() const { return *cast<NSNumber>(object); }
+};
+
+// --- rows shared by several sources --------------------------------------------------------------
+
+Value toItself(const Cast& cast) {
+  return cast.object;
+}
+
+// The text as an untyped value, even where a typed string went into making the object.
+Ref<NSString> plainString(const NSString& text) {
+  return text.kind() == Kind::String ? Ref<NSString>(const_cast<NSString*>(&text))
+                                     : make<NSString>(Kind::String, uint16_t{0}, text);
+}
+
+Value toUntypedAtomic(const Cast& cast) {
+  return XQueryStringValue(*cast.object);
+}
+
+Value toStringFamily(const Cast& cast) {
+  Ref<XQueryString> string = XQueryString::stringWithString(*XQueryStringValue(*cast.object));
+  if (cast.target == XQueryTypeString) return string;
+  return XQueryCastAs(string, cast.target, cast.context);
+}
+
+Value textToTarget(const Cast& cast) {
+  return XQueryCastAs(plainString(*XQueryStringValue(*cast.object)), cast.target, cast.context);
+}
+
+Value toMissingType(const Cast& cast) {
+  cast.context._internal().raise(
+      XQueryError::error(6, "dates, times and durations are not available in this build"));
+}
+
+// --- from strings
+// ----------------------------------------------------------------------------------
+
+Value stringToUntypedAtomic(const Cast& cast) {
+  return plainString(cast.string());
+}
+
+using StringFactory = Ref<XQueryString> (*)(const NSString&);
+
+struct StringFactoryRow {
+  XQueryTypeID type;
+  StringFactory factory;
+};
+
+constexpr StringFactoryRow stringFactories[] = {
+    {XQueryTypeString, XQueryString::stringWithString},
+    {XQueryTypeNormalizedString, XQueryString::normalizedStringWithString},
+    {XQueryTypeToken, XQueryString::tokenWithString},
+    {XQueryTypeLanguage, XQueryString::languageWithString},
+    {XQueryTypeName, XQueryString::nameWithString},
+    {XQueryTypeNCName, XQueryString::ncNameWithString},
+    {XQueryTypeXSID, XQueryString::idWithString},
+    {XQueryTypeIDREF, XQueryString::idRefWithString},
+    {XQueryTypeENTITY, XQueryString::entityWithString},
+    {XQueryTypeNMTOKEN, XQueryString::nmTokenWithString},
+};
+
+Value stringToStringFamily(const Cast& cast) {
+  for (const StringFactoryRow& row : stringFactories) {
+    if (row.type == cast.target) return row.factory(cast.string());
+  }
+  return nullptr;
+}
+
+Value stringToBoolean(const Cast& cast) {
+  const NSStringView text = cast.string().view();
+  if (text == "1" || text == "true") return NSNumber::trueValue();
+  if (text == "0" || text == "false") return NSNumber::falseValue();
+  return nullptr;
+}
+
+// The shared special values are never retyped: an infinite float is the shared infinity, a double.
+Value floatNumber(double value) {
+  Ref<XQueryNumber> number = XQueryNumber::numberWithFloat(static_cast<float>(value));
+  if (!XQueryNumber::isSpecial(number.get())) number->setType(XQueryTypeFloat);
+  return number;
+}
+
+Value doubleNumber(double value, XQueryTypeID target) {
+  if (target == XQueryTypeFloat) return floatNumber(value);
+  return XQueryNumber::numberWithDouble(value);
+}
+
+Value stringToDouble(const Cast& cast) {
+  const NSStringView text = cast.string().view();
+  if (text == "NaN") return XQueryNumber::nan();
+  if (text == "INF") return XQueryNumber::posInf();
+  if (text == "-INF") return XQueryNumber::negInf();
+  double value = 0;
+  if (!scanDouble(text, value)) return nullptr;
+  return doubleNumber(value, cast.target);
+}
+
+// A small whole number cast to integer skips the range rules, which have nothing to say about it.
+Value stringToDecimal(const Cast& cast) {
+  NSDecimal value;
+  if (!NSDecimal::scan(cast.string().view(), value)) return nullptr;
+  if (cast.target == XQueryTypeInteger && value.isSmallInteger()) {
+    return XQueryNumber::integerWithInt64(value.smallInteger());
+  }
+  Ref<XQueryNumber> decimal = XQueryNumber::numberWithDecimal(std::move(value));
+  if (cast.target == XQueryTypeDecimal) return decimal;
+  return XQueryCastAs(decimal, cast.target, cast.context);
+}
+
+Value stringToAnyURI(const Cast& cast) {
+  return NSURL::URLWithString(plainString(cast.string()));
+}
+
+Value stringToQName(const Cast& cast) {
+  const Ref<NSString> name = plainString(cast.string());
+  Ref<NSString> prefix;
+  Ref<NSString> localPart;
+  XQueryQName::parseQNameString(name, prefix, localPart);
+  const XQueryContextInternal& context = cast.context._internal();
+  if (prefix->length() == 0) return XQueryQName::qname(name, context.defaultElementNamespace());
+  const Ref<NSString> URI = context.namespaceForPrefix(prefix->view());
+  if (!URI) return nullptr;
+  return XQueryQName::qname(name, URI);
+}
+
+Value stringToDuration(const Cast& cast) {
+  if (cast.target == XQueryTypeYearMonthDuration) {
+    return XQueryNumber::yearMonthDurationWithString(cast.string().view());
+  }
+  if (cast.target == XQueryTypeDayTimeDuration) {
+    return XQueryNumber::dayTimeDurationWithString(cast.string().view());
+  }
+  return toMissingType(cast);
+}
+
+Value stringToBase64Binary(const Cast& cast) {
+  return XQueryBase64Binary::binaryWithString(cast.string().view());
+}
+
+Value stringToHexBinary(const Cast& cast) {
+  return XQueryHexBinary::binaryWithString(cast.string().view());
+}
+
+// Only from xs:string itself, neither from an untyped value nor from a derived type.
+Value stringToNotation(const Cast& cast) {
+  if (XQueryObjectTypeID(cast.object.get()) != XQueryTypeString) return nullptr;
+  return XQueryNotation::notationWithString(plainString(cast.string()));
+}
+
+// --- from numbers
+// ----------------------------------------------------------------------------------
+
+bool isEqual(const NSNumber& number, const XQueryNumber* other) {
+  return number.isEqualToNumber(*other);
+}
+
+Value numberToBoolean(const Cast& cast) {
+  const NSNumber& number = cast.number();
+  const bool isFalse =
+      isEqual(number, XQueryNumber::nan()) || isEqual(number, XQueryNumber::zero());
+  return NSNumber::numberWithBool(!isFalse);
+}
+
+// The rule is to print the number and read the text again. Where the payload is a machine integer,
+// a small decimal or a double, converting it directly gives the same double: the text is exact, or
+// is the shortest that reads back to the value.
+Value numberToDouble(const Cast& cast) {
+  const NSNumber& number = cast.number();
+  switch (number.storage()) {
+    case NSNumber::Storage::Int64:
+    case NSNumber::Storage::UInt64:
+    case NSNumber::Storage::Double:
+      return doubleNumber(number.doubleValue(), cast.target);
+    case NSNumber::Storage::Decimal: {
+      const NSDecimal value = number.decimalValue();
+      if (!value.isSmallInteger()) break;
+      return doubleNumber(static_cast<double>(value.smallInteger()), cast.target);
+    }
+    default:
+      break;
+  }
+  return textToTarget(cast);
+}
+
+Value booleanToDouble(const Cast& cast) {
+  const bool isTrue = cast.object.get() == NSNumber::trueValue();
+  return XQueryCastAs(Value(isTrue ? XQueryNumber::one() : XQueryNumber::zero()), cast.target,
+                      cast.context);
+}
+
+using NumberFactory = Ref<XQueryNumber> (*)(const NSNumber&);
+
+// By target, from integer on.
+constexpr NumberFactory integerFactories[] = {
+    XQueryNumber::integerWithNumber,
+    XQueryNumber::nonNegativeIntegerWithNumber,
+    XQueryNumber::positiveIntegerWithNumber,
+    XQueryNumber::nonPositiveIntegerWithNumber,
+    XQueryNumber::negativeIntegerWithNumber,
+    XQueryNumber::longWithNumber,
+    XQueryNumber::intWithNumber,
+    XQueryNumber::shortWithNumber,
+    XQueryNumber::byteWithNumber,
+    XQueryNumber::unsignedLongWithNumber,
+    XQueryNumber::unsignedIntWithNumber,
+    XQueryNumber::unsignedShortWithNumber,
+    XQueryNumber::unsignedByteWithNumber,
+};
+static_assert(std::size(integerFactories) == XQueryTypeUnsignedByte - XQueryTypeInteger + 1);
+
+bool isSpecialValue(const NSNumber& number) {
+  switch (number.storage()) {
+    case NSNumber::Storage::Boolean:
+    case NSNumber::Storage::Int64:
+    case NSNumber::Storage::UInt64:
+      return false;
+    default:
+      return isEqual(number, XQueryNumber::nan()) || isEqual(number, XQueryNumber::negInf()) ||
+             isEqual(number, XQueryNumber::posInf());
+  }
+}
+
+// The factories check a machine type's lower bound on the value as given, but a cast checks it on
+// the truncated value: -128.9 is the byte -128. A value that already is an integer goes as it is,
+// because one of a derived type (by number) is taken over without a check.
+Value numberToDecimal(const Cast& cast) {
+  const NSNumber& number = cast.number();
+  if (isSpecialValue(number)) return nullptr;
+  if (cast.target == XQueryTypeDecimal) return XQueryNumber::decimalWithNumber(number);
+  const NumberFactory factory = integerFactories[cast.target - XQueryTypeInteger];
+  if (cast.target >= XQueryTypeLong && XQueryObjectTypeID(&number) < XQueryTypeInteger) {
+    return factory(*XQueryNumber::integerWithNumber(number));
+  }
+  return factory(number);
+}
+
+// --- from the other classes
+// ------------------------------------------------------------------------
+
+// A QName casts to string itself only, not to the types derived from it.
+Value toStringOnly(const Cast& cast) {
+  return cast.target == XQueryTypeString ? toStringFamily(cast) : nullptr;
+}
+
+Value notationToNotation(const Cast& cast) {
+  return XQueryNotation::notationWithString(XQueryStringValue(*cast.object));
+}
+
+Value binaryToHexBinary(const Cast& source) {
+  return XQueryHexBinary::binaryWithData(cast<XQueryBinary>(source.object)->data());
+}
+
+Value binaryToBase64Binary(const Cast& source) {
+  return XQueryBase64Binary::binaryWithData(cast<XQueryBinary>(source.object)->data());
+}
+
+// --- the table
+// -------------------------------------------------------------------------------------
+
+enum class Source : uint8_t {
+  String,
+  Number,
+  Boolean,
+  OrderedDuration,  // a number that counts months or seconds
+  AnyURI,
+  QName,
+  Notation,
+  Base64Binary,
+  HexBinary,
+  None,  // not castable; last
+};
+
+using CastFunction = Value (*)(const Cast&);
+
+struct CastRow {
+  Source from;
+  XQueryTypeID to;  // a primitive type
+  CastFunction function;
+};
+
+constexpr CastRow castRows[] = {
+    {Source::String, XQueryTypeUntypedAtomic, stringToUntypedAtomic},
+    {Source::String, XQueryTypeString, stringToStringFamily},
+    {Source::String, XQueryTypeBoolean, stringToBoolean},
+    {Source::String, XQueryTypeDouble, stringToDouble},
+    {Source::String, XQueryTypeFloat, stringToDouble},
+    {Source::String, XQueryTypeDecimal, stringToDecimal},
+    {Source::String, XQueryTypeAnyURI, stringToAnyURI},
+    {Source::String, XQueryTypeQName, stringToQName},
+    {Source::String, XQueryTypeGYearMonth, toMissingType},
+    {Source::String, XQueryTypeGYear, toMissingType},
+    {Source::String, XQueryTypeGMonthDay, toMissingType},
+    {Source::String, XQueryTypeGDay, toMissingType},
+    {Source::String, XQueryTypeGMonth, toMissingType},
+    {Source::String, XQueryTypeDateTime, toMissingType},
+    {Source::String, XQueryTypeDate, toMissingType},
+    {Source::String, XQueryTypeTime, toMissingType},
+    {Source::String, XQueryTypeDuration, stringToDuration},
+    {Source::String, XQueryTypeBase64Binary, stringToBase64Binary},
+    {Source::String, XQueryTypeHexBinary, stringToHexBinary},
+    {Source::String, XQueryTypeNotation, stringToNotation},
+
+    {Source::Number, XQueryTypeUntypedAtomic, toUntypedAtomic},
+    {Source::Number, XQueryTypeString, toStringFamily},
+    {Source::Number, XQueryTypeBoolean, numberToBoolean},
+    {Source::Number, XQueryTypeDouble, numberToDouble},
+    {Source::Number, XQueryTypeFloat, numberToDouble},
+    {Source::Number, XQueryTypeDecimal, numberToDecimal},
+
+    {Source::Boolean, XQueryTypeUntypedAtomic, toUntypedAtomic},
+    {Source::Boolean, XQueryTypeString, toStringFamily},
+    {Source::Boolean, XQueryTypeBoolean, toItself},
+    {Source::Boolean, XQueryTypeDouble, booleanToDouble},
+    {Source::Boolean, XQueryTypeFloat, booleanToDouble},
+    {Source::Boolean, XQueryTypeDecimal, numberToDecimal},
+
+    {Source::OrderedDuration, XQueryTypeUntypedAtomic, textToTarget},
+    {Source::OrderedDuration, XQueryTypeString, textToTarget},
+    {Source::OrderedDuration, XQueryTypeDuration, textToTarget},
+
+    {Source::AnyURI, XQueryTypeUntypedAtomic, toUntypedAtomic},
+    {Source::AnyURI, XQueryTypeString, toStringFamily},
+
+    {Source::QName, XQueryTypeUntypedAtomic, toUntypedAtomic},
+    {Source::QName, XQueryTypeString, toStringOnly},
+    {Source::QName, XQueryTypeQName, toItself},
+
+    {Source::Notation, XQueryTypeUntypedAtomic, toUntypedAtomic},
+    {Source::Notation, XQueryTypeString, toStringOnly},
+    {Source::Notation, XQueryTypeNotation, notationToNotation},
+
+    {Source::Base64Binary, XQueryTypeUntypedAtomic, toUntypedAtomic},
+    {Source::Base64Binary, XQueryTypeString, toStringFamily},
+    {Source::Base64Binary, XQueryTypeBase64Binary, toItself},
+    {Source::Base64Binary, XQueryTypeHexBinary, binaryToHexBinary},
+
+    {Source::HexBinary, XQueryTypeUntypedAtomic, toUntypedAtomic},
+    {Source::HexBinary, XQueryTypeString, toStringFamily},
+    {Source::HexBinary, XQueryTypeBase64Binary, binaryToBase64Binary},
+    {Source::HexBinary, XQueryTypeHexBinary, toItself},
+};
+
+constexpr size_t sourceCount = static_cast<size_t>(Source::None);
+constexpr size_t primitiveCount = XQueryTypeNotation + 1;
+using CastTable = std::array<std::array<CastFunction, primitiveCount>, sourceCount>;
+
+constexpr CastTable makeCastTable() {
+  CastTable table{};
+  for (const CastRow& row : castRows) {
+    table[static_cast<size_t>(row.from)][static_cast<size_t>(row.to)] = row.function;
+  }
+  return table;
+}
+
+constexpr CastTable castTable = makeCastTable();
+
+Source sourceOfNumber(const NSNumber& number) {
+  if (number.kind() != Kind::TypedNumber) {
+    return number.isBoolean() ? Source::Boolean : Source::Number;
+  }
+  return XQueryIsKindOfType(cast<XQueryNumber>(&number)->typeID(), XQueryTypeDuration)
+             ? Source::OrderedDuration
+             : Source::Number;
+}
+
+Source sourceOf(const NSObject* object) {
+  if (!object) return Source::None;
+  switch (object->kind()) {
+    case Kind::String:
+    case Kind::TypedString:
+      return Source::String;
+    case Kind::Number:
+    case Kind::DecimalNumber:
+    case Kind::TypedNumber:
+      return sourceOfNumber(*cast<NSNumber>(object));
+    case Kind::URL:
+      return Source::AnyURI;
+    case Kind::QName:
+      return Source::QName;
+    case Kind::Notation:
+      return Source::Notation;
+    case Kind::Base64Binary:
+      return Source::Base64Binary;
+    case Kind::HexBinary:
+      return Source::HexBinary;
+    default:
+      return Source::None;
+  }
+}
+
+// The classes whose casts to their own type are rows of the table.
+bool answersItself(Source source) {
+  return source != Source::QName && source != Source::Notation && source != Source::Base64Binary &&
+         source != Source::HexBinary;
+}
+
+}  // namespace
+
+Value XQueryCastAs(const Value& object, XQueryTypeID type, XQueryContext& forContext) {
+  const Source source = sourceOf(object.get());
+  if (source == Source::None) {
+    forContext._internal().raise(XQueryError::error(6, "invalid type conversion"));
+  }
+  if (answersItself(source) && XQueryObjectTypeID(object.get()) == type) return object;
+  const auto primitive = static_cast<size_t>(XQueryPrimitiveTypeForTypeID(type));
+  const CastFunction function =
+      primitive < primitiveCount ? castTable[static_cast<size_t>(source)][primitive] : nullptr;
+  if (function) {
+    if (Value result = function({object, type, forContext})) return result;
+  }
+  Ref<XQueryError> error = XQueryError::error(6, "value does not match a required type");
+  // Of a URI the error is the answer and travels on as an item; no other class does this.
+  if (source == Source::AnyURI) return error;
+  forContext._internal().raise(std::move(error));
+}
+
+Value XQueryCastObject(const Value& object, XQueryTypeID asType, XQueryContext& forContext,
+                       bool allowEmpty) {
+  const int occurrence = allowEmpty ? XQueryOccurrenceAnyAlso : XQueryOccurrenceExactlyOne;
+  Value item = XQueryAtomizationCheckingOccurrence(object, occurrence, forContext);
+  if (allowEmpty && isa<NSNull>(item)) return item;
+  return XQueryCastAs(item, asType, forContext);
+}
+
+Value XQueryCastAsTypeForContext(const Value& object, XQueryTypeID type, XQueryContext& context) {
+  return XQueryCastObject(object, type, context, false);
+}
+
+}  // namespace xquery

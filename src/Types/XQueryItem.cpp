@@ -1,0 +1,48 @@
+// The public questions about a result item.
+#include "Types/XQueryBinary.h"
+#include "Types/XQueryNodeFunctions.h"
+#include "Types/XQueryQName.h"
+#include "Types/XQueryTypeTable.h"
+#include "Types/XQueryValues.h"
+#include "xquery/XQuery.h"
+
+namespace xquery {
+
+std::string XQueryItemTypeName(const NSObject& item) {
+  switch (item.kind()) {
+    case Kind::Document:
+      return "document-node()";
+    case Kind::Element:
+      return "element()";
+    case Kind::Attribute:
+      return "attribute()";
+    case Kind::Namespace:
+      return "namespace()";
+    case Kind::ProcessingInstruction:
+      return "processing-instruction()";
+    case Kind::Comment:
+      return "comment()";
+    case Kind::Text:
+      return "text()";
+    default:
+      break;
+  }
+  const Ref<XQueryQName> name = XQueryQNameForTypeID(XQueryObjectTypeID(&item));
+  if (!name) return "item()";
+  const bool inSchema = name->namespaceURI()->view() == "http://www.w3.org/2001/XMLSchema";
+  return (inSchema ? "xs:" : "xdt:") + name->localPart()->utf8();
+}
+
+std::string XQueryItemStringValue(const NSObject& item) {
+  if (item.isNode()) return XQueryNodeStringValue(cast<NSXMLNode>(&item))->utf8();
+  if (const NSData* data = dyn_cast<NSData>(&item)) return XQueryHexEncode(data->bytes());
+  if (const NSError* error = dyn_cast<NSError>(&item)) return error->description()->utf8();
+  const Ref<NSString> text = XQueryStringValue(item);
+  return text ? text->utf8() : std::string();
+}
+
+Value XQueryUntypedAtomic(std::string_view utf8) {
+  return NSString::stringWithUTF8(utf8);
+}
+
+}  // namespace xquery
