@@ -1,0 +1,68 @@
+// Integers of any size: the seam to GMP.
+#pragma once
+
+#include <gmp.h>
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+
+namespace xquery {
+
+class BigInteger {
+ public:
+  BigInteger() { mpz_init(_value); }
+  BigInteger(int64_t value) { mpz_init_set_si(_value, value); }
+  static BigInteger fromUnsigned(uint64_t value);
+  // Decimal digits only.
+  static BigInteger fromDigits(const std::string& digits);
+  static BigInteger powerOfTen(uint32_t exponent);
+  BigInteger(const BigInteger& other) { mpz_init_set(_value, other._value); }
+  BigInteger(BigInteger&& other) noexcept {
+    mpz_init(_value);
+    mpz_swap(_value, other._value);
+  }
+  BigInteger& operator=(const BigInteger& other) {
+    mpz_set(_value, other._value);
+    return *this;
+  }
+  BigInteger& operator=(BigInteger&& other) noexcept {
+    mpz_swap(_value, other._value);
+    return *this;
+  }
+  ~BigInteger() { mpz_clear(_value); }
+
+  int sign() const { return mpz_sgn(_value); }
+  bool isOdd() const { return mpz_odd_p(_value) != 0; }
+  bool fitsInt64() const { return mpz_fits_slong_p(_value) != 0; }
+  int64_t int64() const { return mpz_get_si(_value); }
+  bool fitsUInt64() const { return mpz_fits_ulong_p(_value) != 0; }
+  uint64_t uint64() const { return mpz_get_ui(_value); }
+  // The number of decimal digits, or one more; fast.
+  size_t digitsAtMost() const { return mpz_sizeinbase(_value, 10); }
+  size_t digits() const;
+
+  void negate() { mpz_neg(_value, _value); }
+  void add(const BigInteger& other) { mpz_add(_value, _value, other._value); }
+  void subtract(const BigInteger& other) { mpz_sub(_value, _value, other._value); }
+  void multiply(const BigInteger& other) { mpz_mul(_value, _value, other._value); }
+  void multiplyByPowerOfTen(uint32_t exponent);
+  // Truncating division; the receiver becomes the quotient, the answer is the remainder.
+  BigInteger divide(const BigInteger& divisor);
+  // The caller knows that nothing remains.
+  void divideExactly(const BigInteger& divisor) { mpz_divexact(_value, _value, divisor._value); }
+  static BigInteger greatestCommonDivisor(const BigInteger& a, const BigInteger& b);
+  // Divides by `factor` as often as nothing remains; answers how often.
+  uint32_t removeFactor(uint32_t factor);
+
+  int compare(const BigInteger& other) const { return mpz_cmp(_value, other._value); }
+  int compareMagnitude(const BigInteger& other) const { return mpz_cmpabs(_value, other._value); }
+  std::string toString() const;
+
+ private:
+  static_assert(sizeof(long) == sizeof(int64_t), "GMP's native integers must have 64 bits");
+
+  mpz_t _value;
+};
+
+}  // namespace xquery

@@ -1,0 +1,529 @@
+// Decimal arithmetic.
+//
+// Every operation has a fast path on 64-bit coefficients, taken as long as the overflow-checking
+// built-ins report none, and a general path on big integers. Both end in the same canonical form:
+// no trailing zeros after the point, a scale of at least 0, and a big coefficient only for what
+// 64 bits do not hold. So equality of values is equality of representations.
+#include "Platform/BigInteger.h"
+#include "Platform/NumberText.h"
+#include "xquery/Number.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cmath>
+#include <limits>
+#include <memory>
+#include <stdexcept>
+
+namespace xquery {
+
+namespace {
+
+constexpr int32_t maximumSmallPower = 18;
+constexpr int64_t smallPowers[maximumSmallPower + 1] = {1,
+                                                        10,
+                                                        100,
+                                                        1000,
+                                                        10000,
+                                                        100000,
+                                                        1000000,
+                                                        10000000,
+                                                        100000000,
+                                                        1000000000,
+                                                        10000000000,
+                                                        100000000000,
+                                                        1000000000000,
+                                                        10000000000000,
+                                                        100000000000000,
+                                                        1000000000000000,
+                                                        10000000000000000,
+                                                        100000000000000000,
+                                                        1000000000000000000};
+constexpr size_t quotientDigits = 38;
+
+__extension__ using Int128 = __int128;
+
+Int128 wideMagnitude(int64_t value) {
+  return value < 0 ? -Int128{value} : Int128{value};
+}
+
+// Whether a magnitude is changed by one away from zero after truncation. `half` compares what was
+// cut off with a half; `odd` is about the truncated value.
+bool roundsAway(NSRoundingMode mode, bool negative, int half, bool odd) {
+  switch (mode) {
+    case NSRoundingMode::TowardZero:
+      return false;
+    case NSRoundingMode::Floor:
+      return negative;
+    case NSRoundingMode::Ceiling:
+      return !negative;
+    case NSRoundingMode::HalfAwayFromZero:
+      return half >= 0;
+    case NSRoundingMode::HalfUp:
+      return half > 0 || (half == 0 && !negative);
+    case NSRoundingMode::HalfEven:
+      return half > 0 || (half == 0 && odd);
+  }
+  return false;
+}
+
+// How often `factor` divides `value`, which is not zero; divides it out.
+uint32_t removeSmallFactor(int64_t& value, int64_t factor) {
+  uint32_t count = 0;
+  for (; value % factor == 0; value /= factor) ++count;
+  return count;
+}
+
+}  // namespace
+
+// The operations that look inside.
+class NSDecimalArithmetic {
+ public:
+  static NSDecimal small(int64_t coefficient, int32_t scale) {
+    NSDecimal result(coefficient);
+    if (scale == 0 || coefficient == 0) return result;
+    while (scale > 0 && result._coefficient % 10 == 0) {
+      result._coefficient /= 10;
+      --scale;
+    }
+    result._scale = scale;
+    return result;
+  }
+
+  static NSDecimal big(BigInteger coefficient, int64_t scale) {
+    if (coefficient.sign() == 0) return NSDecimal();
+    if (scale < 0) {
+      checkDigits(-scale);
+      coefficient.multiplyByPowerOfTen(static_cast<uint32_t>(-scale));
+      scale = 0;
+    } else if (scale > 0 && !coefficient.isOdd()) {
+      stripZeros(coefficient, scale);
+    }
+    checkDigits(scale);
+    if (coefficient.fitsInt64()) return small(coefficient.int64(), static_cast<int32_t>(scale));
+    // One more than the bound may be an overestimate, and does no harm.
+    checkDigits(static_cast<int64_t>(coefficient.digitsAtMost()) - 1);
+    NSDecimal result;
+    result._big = std::make_unique<BigInteger>(std::move(coefficient)).release();
+    result._scale = static_cast<int32_t>(scale);
+    result._state = NSDecimal::Big;
+    return result;
+  }
+
+  static BigInteger coefficient(const NSDecimal& value) {
+    return value._state == NSDecimal::Big ? *value._big : BigInteger(value._coefficient);
+  }
+
+  // Brings two small decimals to one scale; false when 64 bits do not hold them.
+  static bool align(const NSDecimal& a, const NSDecimal& b, int64_t& alignedA, int64_t& alignedB) {
+    if (a._state != NSDecimal::Small || b._state != NSDecimal::Small) return false;
+    alignedA = a._coefficient;
+    alignedB = b._coefficient;
+    const int32_t difference = a._scale - b._scale;
+    if (difference == 0) return true;
+    if (difference > maximumSmallPower || difference < -maximumSmallPower) return false;
+    return difference > 0 ? !__builtin_mul_overflow(alignedB, smallPowers[difference], &alignedB)
+                          : !__builtin_mul_overflow(alignedA, smallPowers[-difference], &alignedA);
+  }
+
+  static void alignBig(const NSDecimal& a, const NSDecimal& b, BigInteger& alignedA,
+                       BigInteger& alignedB) {
+    alignedA = coefficient(a);
+    alignedB = coefficient(b);
+    const int32_t difference = a._scale - b._scale;
+    if (difference > 0) alignedB.multiplyByPowerOfTen(static_cast<uint32_t>(difference));
+    if (difference < 0) alignedA.multiplyByPowerOfTen(static_cast<uint32_t>(-difference));
+  }
+
+  // The decimal exponent of the first digit, or one more.
+  static int64_t magnitudeAtMost(const NSDecimal& value) {
+    return static_cast<int64_t>(coefficient(value).digitsAtMost()) - value._scale;
+  }
+
+  static bool divideSmall(const NSDecimal& a, const NSDecimal& b, NSDecimal& quotient);
+  static NSDecimal divideBig(const NSDecimal& a, const NSDecimal& b);
+  static NSDecimal roundedQuotient(BigInteger numerator, BigInteger denominator);
+  static NSDecimal roundSmall(const NSDecimal& value, int64_t drop, int32_t scale,
+                              NSRoundingMode mode);
+  static NSDecimal roundBig(const NSDecimal& value, int64_t drop, int32_t scale,
+                            NSRoundingMode mode);
+
+ private:
+  static void checkDigits(int64_t digits) {
+    if (digits > NSDecimal::maximumDigits) throw std::length_error("decimal too long");
+  }
+
+  static void stripZeros(BigInteger& coefficient, int64_t& scale) {
+    // Only zeros after the point go, those before it are put back.
+    const int64_t zeros = coefficient.removeFactor(10);
+    if (zeros > scale) coefficient.multiplyByPowerOfTen(static_cast<uint32_t>(zeros - scale));
+    scale -= std::min(zeros, scale);
+  }
+};
+
+using Arithmetic = NSDecimalArithmetic;
+
+void NSDecimal::destroyBig() {
+  std::unique_ptr<BigInteger>{_big}.reset();
+}
+
+void NSDecimal::copyBig(const NSDecimal& other) {
+  _state = Small;  // in case the copy fails
+  _big = std::make_unique<BigInteger>(*other._big).release();
+  _state = Big;
+}
+
+NSDecimal NSDecimal::fromUnsigned(uint64_t value) {
+  if (value <= INT64_MAX) return NSDecimal(static_cast<int64_t>(value));
+  return Arithmetic::big(BigInteger::fromUnsigned(value), 0);
+}
+
+NSDecimal NSDecimal::fromDouble(double value) {
+  constexpr double exactIntegers = 9007199254740992.0;  // 2 to the 53rd
+  if (!std::isfinite(value)) return NSDecimal();
+  if (value == std::trunc(value) && std::fabs(value) <= exactIntegers) {
+    return NSDecimal(static_cast<int64_t>(value));
+  }
+  NSDecimal result;
+  char buffer[64];
+  const std::to_chars_result written =
+      std::to_chars(buffer, buffer + sizeof buffer, value, std::chars_format::scientific);
+  scan({buffer, static_cast<uint32_t>(written.ptr - buffer)}, result);
+  return result;
+}
+
+NSDecimal NSDecimal::notANumber() {
+  NSDecimal result;
+  result._state = NaN;
+  return result;
+}
+
+bool NSDecimal::scan(NSStringView text, NSDecimal& out) {
+  NumberExtent extent;
+  if (!findNumber(text, extent)) return false;
+  std::string digits = text.substring(extent.digits, extent.point - extent.digits).utf8();
+  if (extent.mantissaEnd > extent.point) {
+    text.substring(extent.point + 1, extent.mantissaEnd - extent.point - 1).appendUTF8To(digits);
+  }
+  int64_t scale = extent.mantissaEnd > extent.point ? extent.mantissaEnd - extent.point - 1 : 0;
+  scale -= extent.exponent;
+  digits.erase(0, digits.find_first_not_of('0'));
+  if (digits.empty()) {
+    out = NSDecimal();
+    return true;
+  }
+  const size_t trailing = digits.size() - 1 - digits.find_last_not_of('0');
+  digits.resize(digits.size() - trailing);
+  scale -= static_cast<int64_t>(trailing);
+  const int64_t length = static_cast<int64_t>(digits.size()) - std::min<int64_t>(scale, 0);
+  if (length > maximumDigits || scale > maximumDigits) return false;
+  if (length <= maximumSmallPower && scale >= 0) {
+    int64_t coefficient = 0;
+    std::from_chars(digits.data(), digits.data() + digits.size(), coefficient);
+    out = Arithmetic::small(extent.negative ? -coefficient : coefficient,
+                            static_cast<int32_t>(scale));
+    return true;
+  }
+  BigInteger coefficient = BigInteger::fromDigits(digits);
+  if (extent.negative) coefficient.negate();
+  out = Arithmetic::big(std::move(coefficient), scale);
+  return true;
+}
+
+int NSDecimal::sign() const {
+  if (_state == NaN) return 0;
+  if (_state == Big) return _big->sign();
+  return _coefficient < 0 ? -1 : _coefficient > 0 ? 1 : 0;
+}
+
+bool NSDecimal::isInteger() const {
+  return _state != NaN && _scale == 0;
+}
+
+NSDecimal NSDecimal::add(const NSDecimal& other) const {
+  int64_t a = 0;
+  int64_t b = 0;
+  if (Arithmetic::align(*this, other, a, b) && !__builtin_add_overflow(a, b, &a)) {
+    return Arithmetic::small(a, std::max(_scale, other._scale));
+  }
+  if (isNaN() || other.isNaN()) return notANumber();
+  BigInteger bigA;
+  BigInteger bigB;
+  Arithmetic::alignBig(*this, other, bigA, bigB);
+  bigA.add(bigB);
+  return Arithmetic::big(std::move(bigA), std::max(_scale, other._scale));
+}
+
+NSDecimal NSDecimal::subtract(const NSDecimal& other) const {
+  int64_t a = 0;
+  int64_t b = 0;
+  if (Arithmetic::align(*this, other, a, b) && !__builtin_sub_overflow(a, b, &a)) {
+    return Arithmetic::small(a, std::max(_scale, other._scale));
+  }
+  if (isNaN() || other.isNaN()) return notANumber();
+  BigInteger bigA;
+  BigInteger bigB;
+  Arithmetic::alignBig(*this, other, bigA, bigB);
+  bigA.subtract(bigB);
+  return Arithmetic::big(std::move(bigA), std::max(_scale, other._scale));
+}
+
+NSDecimal NSDecimal::multiply(const NSDecimal& other) const {
+  int64_t product = 0;
+  if (_state == Small && other._state == Small &&
+      !__builtin_mul_overflow(_coefficient, other._coefficient, &product) &&
+      _scale + other._scale <= maximumDigits) {
+    return Arithmetic::small(product, _scale + other._scale);
+  }
+  if (isNaN() || other.isNaN()) return notANumber();
+  BigInteger result = Arithmetic::coefficient(*this);
+  result.multiply(Arithmetic::coefficient(other));
+  return Arithmetic::big(std::move(result), int64_t{_scale} + other._scale);
+}
+
+// Quotients of small decimals that end within 64 bits.
+bool NSDecimalArithmetic::divideSmall(const NSDecimal& a, const NSDecimal& b, NSDecimal& quotient) {
+  int64_t numerator = 0;
+  int64_t denominator = 0;
+  if (!align(a, b, numerator, denominator)) return false;
+  if (numerator == INT64_MIN || denominator == INT64_MIN) return false;
+  if (numerator == 0) {
+    quotient = NSDecimal();
+    return true;
+  }
+  for (int64_t x = numerator, y = denominator;;) {  // Euclid's algorithm
+    if (x % y == 0) {
+      numerator /= y;
+      denominator /= y;
+      break;
+    }
+    y = std::exchange(x, y) % y;
+  }
+  if (denominator < 0) {
+    numerator = -numerator;
+    denominator = -denominator;
+  }
+  int64_t rest = denominator;
+  const uint32_t twos = removeSmallFactor(rest, 2);
+  const uint32_t fives = removeSmallFactor(rest, 5);
+  const auto scale = static_cast<int32_t>(std::max(twos, fives));
+  if (rest != 1 || scale > maximumSmallPower) return false;
+  int64_t coefficient = 0;
+  if (__builtin_mul_overflow(numerator, smallPowers[scale] / denominator, &coefficient)) {
+    return false;
+  }
+  quotient = small(coefficient, scale);
+  return true;
+}
+
+// 38 significant digits of a quotient that does not end (or ends too late to be written out).
+NSDecimal NSDecimalArithmetic::roundedQuotient(BigInteger numerator, BigInteger denominator) {
+  // The estimates of the digit counts may each be one too large; this yields 40 to 43 digits.
+  const int64_t shift = static_cast<int64_t>(quotientDigits) + 3 +
+                        static_cast<int64_t>(denominator.digitsAtMost()) -
+                        static_cast<int64_t>(numerator.digitsAtMost());
+  if (shift > 0) numerator.multiplyByPowerOfTen(static_cast<uint32_t>(shift));
+  if (shift < 0) denominator.multiplyByPowerOfTen(static_cast<uint32_t>(-shift));
+  const bool negative = numerator.sign() != denominator.sign();
+  numerator.divide(denominator);
+  if (numerator.sign() < 0) numerator.negate();
+  // Truncated digits decide the rounding: what follows them never reaches the next half.
+  const size_t drop = numerator.digits() - quotientDigits;
+  const BigInteger power = BigInteger::powerOfTen(static_cast<uint32_t>(drop));
+  BigInteger remainder = numerator.divide(power);
+  remainder.add(BigInteger(remainder));
+  if (remainder.compare(power) >= 0) numerator.add(BigInteger(int64_t{1}));
+  if (negative) numerator.negate();
+  return big(std::move(numerator), shift - static_cast<int64_t>(drop));
+}
+
+NSDecimal NSDecimalArithmetic::divideBig(const NSDecimal& a, const NSDecimal& b) {
+  BigInteger numerator;
+  BigInteger denominator;
+  alignBig(a, b, numerator, denominator);
+  const BigInteger divisor = BigInteger::greatestCommonDivisor(numerator, denominator);
+  numerator.divideExactly(divisor);
+  denominator.divideExactly(divisor);
+  if (denominator.sign() < 0) {
+    numerator.negate();
+    denominator.negate();
+  }
+  BigInteger rest = denominator;
+  const uint32_t scale = std::max(rest.removeFactor(2), rest.removeFactor(5));
+  const bool ends = rest.compare(BigInteger(int64_t{1})) == 0;
+  if (!ends || scale + numerator.digitsAtMost() > NSDecimal::maximumDigits) {
+    return roundedQuotient(std::move(numerator), std::move(denominator));
+  }
+  BigInteger factor = BigInteger::powerOfTen(scale);
+  factor.divideExactly(denominator);
+  numerator.multiply(factor);
+  return big(std::move(numerator), scale);
+}
+
+NSDecimal NSDecimal::divide(const NSDecimal& divisor) const {
+  if (isNaN() || divisor.isNaN() || divisor.isZero()) return notANumber();
+  NSDecimal quotient;
+  if (Arithmetic::divideSmall(*this, divisor, quotient)) return quotient;
+  return Arithmetic::divideBig(*this, divisor);
+}
+
+NSDecimal NSDecimal::integerDivide(const NSDecimal& divisor) const {
+  if (isNaN() || divisor.isNaN() || divisor.isZero()) return notANumber();
+  int64_t a = 0;
+  int64_t b = 0;
+  // The one quotient that overflows is that of the least integer by -1.
+  if (Arithmetic::align(*this, divisor, a, b) && (a != INT64_MIN || b != -1)) return a / b;
+  BigInteger bigA;
+  BigInteger bigB;
+  Arithmetic::alignBig(*this, divisor, bigA, bigB);
+  bigA.divide(bigB);
+  return Arithmetic::big(std::move(bigA), 0);
+}
+
+NSDecimal NSDecimal::remainder(const NSDecimal& divisor) const {
+  if (isNaN() || divisor.isNaN() || divisor.isZero()) return notANumber();
+  const int32_t scale = std::max(_scale, divisor._scale);
+  int64_t a = 0;
+  int64_t b = 0;
+  if (Arithmetic::align(*this, divisor, a, b)) {
+    return Arithmetic::small(b == -1 ? 0 : a % b, scale);
+  }
+  BigInteger bigA;
+  BigInteger bigB;
+  Arithmetic::alignBig(*this, divisor, bigA, bigB);
+  return Arithmetic::big(bigA.divide(bigB), scale);
+}
+
+NSDecimal NSDecimal::negate() const {
+  return NSDecimal().subtract(*this);
+}
+
+NSDecimal NSDecimalArithmetic::roundSmall(const NSDecimal& value, int64_t drop, int32_t scale,
+                                          NSRoundingMode mode) {
+  const bool negative = value._coefficient < 0;
+  const Int128 magnitude = wideMagnitude(value._coefficient);
+  Int128 quotient = 0;
+  int half = -1;
+  // Twenty digits and more exceed twice every 64-bit coefficient.
+  if (drop < 20) {
+    const Int128 power =
+        drop <= maximumSmallPower ? Int128{smallPowers[drop]} : Int128{smallPowers[drop - 1]} * 10;
+    quotient = magnitude / power;
+    const Int128 twice = (magnitude % power) * 2;
+    if (twice == 0)
+      half = -2;  // nothing is cut off
+    else
+      half = twice < power ? -1 : twice > power ? 1 : 0;
+  }
+  if (half != -2 && roundsAway(mode, negative, half, quotient % 2 != 0)) ++quotient;
+  const auto result = static_cast<int64_t>(negative ? -quotient : quotient);
+  return scale >= 0 ? small(result, scale) : big(BigInteger(result), scale);
+}
+
+NSDecimal NSDecimalArithmetic::roundBig(const NSDecimal& value, int64_t drop, int32_t scale,
+                                        NSRoundingMode mode) {
+  BigInteger quotient = *value._big;
+  const bool negative = quotient.sign() < 0;
+  if (negative) quotient.negate();
+  int half = -1;
+  if (drop > static_cast<int64_t>(quotient.digitsAtMost())) {
+    quotient = BigInteger();
+  } else {
+    const BigInteger power = BigInteger::powerOfTen(static_cast<uint32_t>(drop));
+    BigInteger remainder = quotient.divide(power);
+    if (remainder.sign() == 0)
+      half = -2;  // nothing is cut off
+    else {
+      remainder.add(BigInteger(remainder));
+      half = remainder.compare(power);
+    }
+  }
+  if (half != -2 && roundsAway(mode, negative, half, quotient.isOdd())) {
+    quotient.add(BigInteger(int64_t{1}));
+  }
+  if (negative) quotient.negate();
+  return big(std::move(quotient), scale);
+}
+
+NSDecimal NSDecimal::rounded(int32_t scale, NSRoundingMode mode) const {
+  const int64_t drop = int64_t{_scale} - scale;
+  if (isNaN() || isZero() || drop <= 0) return *this;
+  return _state == Small ? Arithmetic::roundSmall(*this, drop, scale, mode)
+                         : Arithmetic::roundBig(*this, drop, scale, mode);
+}
+
+int NSDecimal::compare(const NSDecimal& other) const {
+  int64_t a = 0;
+  int64_t b = 0;
+  if (Arithmetic::align(*this, other, a, b)) return a < b ? -1 : a > b ? 1 : 0;
+  if (isNaN() || other.isNaN()) return (other.isNaN() ? 1 : 0) - (isNaN() ? 1 : 0);
+  if (sign() != other.sign()) return sign() < other.sign() ? -1 : 1;
+  // Magnitudes far apart decide without the powers of ten in between.
+  const int64_t difference =
+      Arithmetic::magnitudeAtMost(*this) - Arithmetic::magnitudeAtMost(other);
+  if (difference > 1) return sign();
+  if (difference < -1) return -sign();
+  BigInteger bigA;
+  BigInteger bigB;
+  Arithmetic::alignBig(*this, other, bigA, bigB);
+  const int order = bigA.compare(bigB);
+  return order < 0 ? -1 : order > 0 ? 1 : 0;
+}
+
+uint32_t NSDecimal::hash() const {
+  return hashDouble(doubleValue());
+}
+
+double NSDecimal::doubleValue() const {
+  constexpr int32_t exactPowers = 22;  // powers of ten that a double holds exactly
+  constexpr double powers[exactPowers + 1] = {1e0,  1e1,  1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
+                                              1e8,  1e9,  1e10, 1e11, 1e12, 1e13, 1e14, 1e15,
+                                              1e16, 1e17, 1e18, 1e19, 1e20, 1e21, 1e22};
+  constexpr int64_t exactIntegers = int64_t{1} << 53;
+  if (_state == NaN) return std::numeric_limits<double>::quiet_NaN();
+  if (_state == Small) {
+    const auto value = static_cast<double>(_coefficient);
+    if (_scale == 0) return value;
+    // One division of exact operands is rounded correctly.
+    if (_scale <= exactPowers && _coefficient <= exactIntegers && _coefficient >= -exactIntegers) {
+      return value / powers[_scale];
+    }
+  }
+  const std::string digits = _state == Big ? _big->toString() : std::to_string(_coefficient);
+  double value = 0;
+  scanDouble(NSStringView::ascii(digits + "e-" + std::to_string(_scale)), value);
+  return value;
+}
+
+int64_t NSDecimal::int64Value() const {
+  if (_state == NaN) return 0;
+  const NSDecimal whole = truncated();
+  if (whole._state == Small) return whole._coefficient;
+  return whole.sign() < 0 ? INT64_MIN : INT64_MAX;
+}
+
+uint64_t NSDecimal::uint64Value() const {
+  if (sign() <= 0) return 0;
+  const NSDecimal whole = truncated();
+  if (whole._state == Small) return static_cast<uint64_t>(whole._coefficient);
+  return whole._big->fitsUInt64() ? whole._big->uint64() : UINT64_MAX;
+}
+
+std::string NSDecimal::toString() const {
+  if (_state == NaN) return "NaN";
+  std::string text;
+  if (_state == Small) {
+    char buffer[24];
+    text.assign(buffer, std::to_chars(buffer, buffer + sizeof buffer, _coefficient).ptr);
+  } else {
+    text = _big->toString();
+  }
+  if (_scale == 0) return text;
+  const size_t first = text[0] == '-' ? 1 : 0;
+  const auto scale = static_cast<size_t>(_scale);
+  const size_t digits = text.size() - first;
+  if (digits <= scale) text.insert(first, scale - digits + 1, '0');
+  return text.insert(text.size() - scale, 1, '.');
+}
+
+}  // namespace xquery
