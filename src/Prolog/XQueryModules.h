@@ -1,13 +1,17 @@
 // Namespace IDs of one compilation, and the library modules it loaded.
+//
+// Who keeps whom: the prolog for which no registry existed makes one and owns it; the registry owns
+// the library prologs that register with it, and those only point back. So a main module and all it
+// loaded go together, and no cycle of references keeps any of it. A library prolog that is replaced
+// under its ID is kept as well, for others may have copied its declarations by then.
 #pragma once
 
+#include "Prolog/StringTable.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
 #include <cstdint>
-#include <unordered_map>
 #include <vector>
-
 namespace xquery {
 
 class XQueryProlog;
@@ -39,8 +43,12 @@ class XQueryModules : public NSCounted {
   Ref<NSString> namespaceForID(int64_t id) const;
   // 0 for an unknown URI that may not be created. The first new one gets 12.
   int64_t namespaceID(const Ref<NSString>& URI, bool canCreate);
+  // Null for an ID below 1, past the end, and where no prolog was added.
   XQueryProlog* prologForID(int64_t id) const;
+  // Replaces what was there. A prolog added to its own registry must not be used after it.
   void addProlog(Ref<XQueryProlog> prolog, int64_t forID);
+  // For the prolog that owns this registry, when it goes.
+  void forgetProlog(const XQueryProlog& prolog);
 
  protected:
   XQueryModules();
@@ -49,9 +57,10 @@ class XQueryModules : public NSCounted {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  std::vector<Ref<NSString>> _namespaces;
-  std::unordered_map<std::string, int64_t> _namespaceIDs;
-  std::vector<Ref<XQueryProlog>> _prologs;
+  std::vector<Ref<NSString>> _namespaces;  // from ID 12 on; the built-in ones are shared
+  StringTable<int64_t> _namespaceIDs;      // the same namespaces
+  std::vector<XQueryProlog*> _prologs;     // by ID
+  std::vector<Ref<XQueryProlog>> _ownedPrologs;
 };
 
 }  // namespace xquery

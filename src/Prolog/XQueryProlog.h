@@ -1,6 +1,7 @@
 // The static context of one module.
 #pragma once
 
+#include "Prolog/StringTable.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
@@ -9,7 +10,6 @@
 #include "xquery/XMLNode.h"
 
 #include <cstdint>
-#include <string>
 #include <unordered_map>
 #include <vector>
 
@@ -73,8 +73,12 @@ class XQueryProlog : public NSCounted {
   const std::vector<Value>& declarations() const { return _declarations; }
   const std::vector<Ref<XQueryError>>& errors() const { return _errors; }
   const std::vector<Ref<XQueryQNameReference>>& qNameReferences() const { return _qNameReferences; }
-  const std::vector<Ref<XQueryPrologItemModuleImport>>& moduleImports() const;
-  const std::vector<Ref<XQueryPrologItemSchemaImport>>& schemaImports() const;
+  const std::vector<Ref<XQueryPrologItemModuleImport>>& moduleImports() const {
+    return _moduleImports;
+  }
+  const std::vector<Ref<XQueryPrologItemSchemaImport>>& schemaImports() const {
+    return _schemaImports;
+  }
 
   // --- namespaces ------------------------------------------------------------------------------
   // The in-scope namespaces first (`fromProlog` false), then the declared prefixes. Null for an
@@ -105,6 +109,15 @@ class XQueryProlog : public NSCounted {
   int64_t newLocalVariableIDForQName(const Ref<XQueryQName>& qName);
   int64_t nextLocalVariableID() const { return _nextLocalVariableID; }
   void setNextLocalVariableID(int64_t id) { _nextLocalVariableID = id; }
+  // The local variables at one point of the binding pass. An expression whose variables end with it
+  // puts back the scope it found: the next ID, and which name has which ID, so that an outer
+  // variable shadowed inside is visible again and an inner one is not.
+  struct LocalScope {
+    int64_t nextID;
+    size_t namedCount;
+  };
+  LocalScope localScope() const { return {_nextLocalVariableID, _localVariableLog.size()}; }
+  void restoreLocalScope(const LocalScope& scope);
   // Null when the name does not resolve.
   Ref<XQueryQName> variableQNameFromString(const Ref<NSString>& name) const;
   Ref<XQueryQName> functionQNameFromString(const Ref<NSString>& name) const;
@@ -129,19 +142,36 @@ class XQueryProlog : public NSCounted {
   // Accepts its arguments and does nothing: no schema is ever loaded.
   void setDefaultSchema(const Ref<NSString>& URI, const Ref<NSString>& atLocation);
 
+  // For diagnostics.
   Ref<NSString> description() const;
 
-  XQueryProlog();
+  // Whether this prolog made and owns the registry.
+  bool ownsModules(const XQueryModules& modules) const;
+  // The registry owns this prolog from now on.
+  void disownModules(const XQueryModules& modules);
+
+  // Without a registry it makes one.
+  explicit XQueryProlog(Ref<XQueryModules> modules = nullptr);
 
  protected:
   ~XQueryProlog() override;
 
  private:
+  void removePrefix(const Ref<NSString>& prefix, int64_t fromBuiltinID);
+  void _importDeclarations(const XQueryProlog& module);
+  void bindDeclaration(NSObject& declaration);
   void _addItems(const std::vector<Ref<XQueryPrologItem>>& items);
   void _resolveImports();
   void _bindInfo();
 
-  Ref<XQueryModules> _modules;
+  struct NamedLocal {
+    Ref<XQueryQName> name;
+    int64_t replacedID;  // 0: the name had none
+  };
+
+  XQueryModules* _modules;
+  Ref<XQueryModules> _ownedModules;  // null once the registry owns this prolog
+  bool _madeModules;
   Ref<NSString> _modulePrefix;
   Ref<NSString> _defaultCollation;
   Ref<NSString> _defaultElementNamespace;
@@ -152,8 +182,8 @@ class XQueryProlog : public NSCounted {
   std::vector<Ref<XQueryError>> _errors;
   std::vector<Ref<XQueryPrologItemModuleImport>> _moduleImports;
   std::vector<Ref<XQueryPrologItemSchemaImport>> _schemaImports;
-  std::vector<Value> _namespacePrefixes;  // by ID: NSNull, a string, or an array of strings
-  std::unordered_map<std::string, int64_t> _namespacePrefixIDs;
+  std::vector<Value> _namespacePrefixes;     // by ID: NSNull, a string, or an array of strings
+  StringTable<int64_t> _namespacePrefixIDs;  // what was declared, over the predeclared ones
   std::vector<Value> _declarations;
   std::vector<Ref<XQueryQNameReference>> _qNameReferences;
   std::unordered_map<Ref<XQueryQName>, Ref<XQueryVarDecl>, XQueryQNameHash, XQueryQNameEqual>
@@ -163,6 +193,7 @@ class XQueryProlog : public NSCounted {
   int64_t _nextLocalVariableID = 1;
   std::unordered_map<Ref<XQueryQName>, int64_t, XQueryQNameHash, XQueryQNameEqual>
       _localVariableIDs;
+  std::vector<NamedLocal> _localVariableLog;  // in the order the IDs were handed out
   std::vector<std::vector<Ref<NSXMLNode>>> _inScopeNamespaces;
   bool _xmlSpacePreserve = false;
   bool _constructionPreserve = true;

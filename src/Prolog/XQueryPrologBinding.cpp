@@ -1,0 +1,141 @@
+// The declarations of a prolog: their tables, the import of those of library modules, the numbering
+// of local variables, and the binding pass over the declarations.
+#include "Prolog/MessageText.h"
+#include "Prolog/XQueryDeclarations.h"
+#include "Prolog/XQueryModules.h"
+#include "Prolog/XQueryProlog.h"
+#include "Prolog/XQueryPrologItems.h"
+
+namespace xquery {
+
+// --- tables --------------------------------------------------------------------------------------
+
+XQueryVarDecl* XQueryProlog::variableInfoForQName(const Ref<XQueryQName>& qName) const {
+  const auto found = _variables.find(qName);
+  return found == _variables.end() ? nullptr : found->second.get();
+}
+
+void XQueryProlog::setVariableInfo(Ref<XQueryVarDecl> declaration,
+                                   const Ref<XQueryQName>& forQName) {
+  _declarations.push_back(declaration);
+  _variables.insert_or_assign(forQName, std::move(declaration));
+}
+
+XQueryFunctionDecl* XQueryProlog::functionInfoForSignature(
+    const XQueryFunctionSignature& signature) const {
+  const auto found = _functions.find(signature);
+  return found == _functions.end() ? nullptr : found->second.get();
+}
+
+void XQueryProlog::setFunctionInfo(Ref<XQueryFunctionDecl> declaration,
+                                   const XQueryFunctionSignature& forSignature) {
+  _declarations.push_back(declaration);
+  _functions.insert_or_assign(forSignature, std::move(declaration));
+}
+
+// --- local variables -----------------------------------------------------------------------------
+
+int64_t XQueryProlog::localVariableIDForQName(const Ref<XQueryQName>& qName) const {
+  const auto found = _localVariableIDs.find(qName);
+  if (found == _localVariableIDs.end() || found->second >= _nextLocalVariableID) return 0;
+  return found->second;
+}
+
+int64_t XQueryProlog::newLocalVariableIDForQName(const Ref<XQueryQName>& qName) {
+  int64_t& recordedID = _localVariableIDs[qName];
+  _localVariableLog.push_back({qName, recordedID});
+  recordedID = _nextLocalVariableID++;
+  return recordedID;
+}
+
+void XQueryProlog::restoreLocalScope(const LocalScope& scope) {
+  while (_localVariableLog.size() > scope.namedCount) {
+    const NamedLocal& last = _localVariableLog.back();
+    if (last.replacedID == 0) {
+      _localVariableIDs.erase(last.name);
+    } else {
+      _localVariableIDs[last.name] = last.replacedID;
+    }
+    _localVariableLog.pop_back();
+  }
+  _nextLocalVariableID = scope.nextID;
+}
+
+// --- imports -------------------------------------------------------------------------------------
+
+void XQueryProlog::_resolveImports() {
+  for (const auto& item : _moduleImports) {
+    const int64_t id = namespaceID(item->namespaceString());
+    if (const XQueryProlog* module = _modules->prologForID(id)) {
+      _importDeclarations(*module);
+      continue;
+    }
+    const auto message = messageText("can't access module for ", item->description());
+    // Without any location clause the failure is recorded twice.
+    if (!item->locations()) addError(XQueryError::error(47, message));
+    addError(XQueryError::error(47, message));
+  }
+}
+
+// Copies what the module declared in its own namespace, and nothing that it imported itself. A
+// module that imports itself finds each of its names taken, so the walk never sees its own growth.
+void XQueryProlog::_importDeclarations(const XQueryProlog& module) {
+  if (!module.isModule()) return;
+  const int64_t moduleID = module.namespaceIDForPrefix(module._modulePrefix->view());
+  const auto isOwn = [&](const XQueryQName& name) {
+    return module.namespaceID(name.namespaceURI()) == moduleID;
+  };
+  for (size_t index = 0; index < module._declarations.size(); ++index) {
+    const Value declaration = module._declarations[index];
+    if (auto* variable = dyn_cast<XQueryVarDecl>(declaration)) {
+      const auto& name = variable->name();
+      if (!isOwn(*name)) continue;
+      if (variableInfoForQName(name)) {
+        addError(XQueryError::error(
+            37, messageText("duplicate definition of variable ", name->XQueryStringValue())));
+      } else {
+        setVariableInfo(variable, name);
+      }
+    } else if (auto* function = dyn_cast<XQueryFunctionDecl>(declaration)) {
+      const auto& name = function->name();
+      if (!isOwn(*name)) continue;
+      const XQueryFunctionSignature signature(name, function->params().size());
+      if (functionInfoForSignature(signature)) {
+        addError(XQueryError::error(
+            37, messageText("duplicate definition of function ", name->XQueryStringValue())));
+      } else {
+        setFunctionInfo(function, signature);
+      }
+    }
+  }
+}
+
+// --- binding -------------------------------------------------------------------------------------
+
+// Local variable IDs start at 1 in every declaration, and no name of one is visible in the next:
+// otherwise a name left over from the last body would pass for a parameter given twice.
+void XQueryProlog::_bindInfo() {
+  for (size_t index = 0; index < _declarations.size(); ++index) {
+    _nextLocalVariableID = 1;
+    const LocalScope scope = localScope();
+    const Value declaration = _declarations[index];
+    bindDeclaration(*declaration);
+    restoreLocalScope(scope);
+  }
+}
+
+// What was imported has been bound in its own module.
+void XQueryProlog::bindDeclaration(NSObject& declaration) {
+  XQueryExpr* expr = nullptr;
+  if (auto* variable = dyn_cast<XQueryVarDecl>(&declaration)) {
+    if (variable->isExternal() || &variable->prolog() != this) return;
+    expr = variable->expr();
+  } else if (auto* function = dyn_cast<XQueryFunctionDecl>(&declaration)) {
+    if (function->isExternal() || &function->prolog() != this) return;
+    for (const auto& param : function->params()) param->bindInfoForProlog(*this);
+    expr = function->expr();
+  }
+  if (expr) expr->bindInfoForProlog(*this);
+}
+
+}  // namespace xquery
