@@ -24,7 +24,8 @@ class XQueryNumber : public NSNumber {
   // Whether the object is one of the shared NaN and infinities.
   static bool isSpecial(const NSObject* object);
 
-  // Null when the value is not representable in the type.
+  // Null when the value is not representable in the type. A NaN or an infinity as a decimal or
+  // integer is the shared value.
   [[nodiscard]] static Ref<XQueryNumber> number(const NSNumber& withNumber, XQueryTypeID type);
   [[nodiscard]] static Ref<XQueryNumber> doubleWithNumber(const NSNumber& number);
   [[nodiscard]] static Ref<XQueryNumber> floatWithNumber(const NSNumber& number);
@@ -73,6 +74,9 @@ class XQueryNumber : public NSNumber {
       : NSNumber(Kind::TypedNumber, static_cast<uint16_t>(type), std::forward<Payload>(value)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
+
+ private:
+  static Ref<XQueryNumber> singlePrecision(const NSNumber& number);
 };
 
 }  // namespace xquery
