@@ -1,15 +1,22 @@
 // Path expressions: a chain of steps hung from one expression.
+//
+// Steps are evaluated item by item and node by node. A step without predicates hands each node it
+// finds straight to the next step as a raw pointer; a step with predicates first gathers its nodes
+// for one context item. Only the last step stores nodes, and only stored nodes are referenced: the
+// tree is kept alive by the item the path started from.
 #pragma once
-
-#include <vector>
 
 #include "Expr/XQueryExpr.h"
 #include "Expr/XQueryTypeDeclaration.h"
 #include "xquery/XMLNode.h"
 
+#include <optional>
+#include <vector>
+
 namespace xquery {
 
 class XQueryPathResults;
+class XQueryPathRun;
 
 enum XQueryAxis : int {
   XQueryAxisChild = 1,
@@ -52,10 +59,27 @@ class XQueryStep : public NSCounted {
   XQueryStep(Kind kind, Ref<XQueryExpr> initWithExpr)
       : NSCounted(kind), _expr(std::move(initWithExpr)) {}
 
+  // The same as handlePreicatesFromIndex over a list of nodes, in place.
+  void filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex, XQueryContext& context) const;
+  // The position that predicate `index` asks for when it is a numeric literal.
+  std::optional<uint64_t> literalPosition(size_t index) const;
+  // Whether every predicate is a numeric literal, so that filtering evaluates nothing.
+  bool hasOnlyLiteralPositions() const;
+
   Ref<XQueryExpr> _expr;
   Ref<XQueryStep> _next;
-  XQueryStep* _tail = nullptr;  // a step at or after this one, near the end of the chain
+  Ref<XQueryStep> _tail;  // where the last setLast ended: the chain's end, or near it
   std::vector<Ref<XQueryExpr>> _predicates;
+
+ private:
+  // processItems within one evaluation of a path: for a value of any shape, for one node, and for
+  // the nodes that a step with predicates kept.
+  virtual void processValue(const Value& items, XQueryPathRun& run, bool validate) const;
+  virtual void processNode(NSXMLNode* node, XQueryPathRun& run) const;
+  virtual void processNodes(const std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const;
+  friend class XQueryAxisStep;
+  friend class XQueryFilterStep;
+  friend class XQueryPathExpr;
 };
 
 class XQueryAxisStep : public XQueryStep {
@@ -65,7 +89,9 @@ class XQueryAxisStep : public XQueryStep {
   [[nodiscard]] static Ref<XQueryAxisStep> axisStepWithAxis(int axis, Ref<XQueryExpr> nodeTest);
 
   int axis() const { return _axis; }
-  bool isReverse() const { return _axis >= XQueryAxisAncestor && _axis <= XQueryAxisAncestorOrSelf; }
+  bool isReverse() const {
+    return _axis >= XQueryAxisAncestor && _axis <= XQueryAxisAncestorOrSelf;
+  }
   static bool isValid(const NSXMLNode* node, const XQueryExpr* expr, XQueryContext& context);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
@@ -79,7 +105,22 @@ class XQueryAxisStep : public XQueryStep {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  void processValue(const Value& items, XQueryPathRun& run, bool validate) const override;
+  void processNode(NSXMLNode* node, XQueryPathRun& run) const override;
+  void processNodes(const std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const override;
+
+  void enter(NSXMLNode* node, XQueryPathRun& run) const;
+  void stream(int axis, NSXMLNode* node, XQueryPathRun& run) const;
+  void filter(NSXMLNode* node, XQueryPathRun& run) const;
+  size_t collect(NSXMLNode* node, std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const;
+  bool testMayRaise() const;
+  bool isPure() const;
+  bool isDescendantShorthand() const;
+  bool takesPlainChildren() const;
+  friend class XQueryPathExpr;
+
   int _axis;
+  bool _absorbsNext = false;  // set by binding, see XQueryPath.cpp
 };
 
 class XQueryFilterStep : public XQueryStep {
@@ -97,6 +138,12 @@ class XQueryFilterStep : public XQueryStep {
       : XQueryStep(kind, std::move(expr)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
+
+ private:
+  void processValue(const Value& items, XQueryPathRun& run, bool validate) const override;
+  void processNode(NSXMLNode* node, XQueryPathRun& run) const override;
+  void processNodes(const std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const override;
+  void processItem(NSObject* item, int64_t position, XQueryPathRun& run, bool validate) const;
 };
 
 // The step that heads an absolute path.
@@ -133,6 +180,7 @@ class XQueryPathExpr : public XQueryExpr {
   static bool classof(const NSObject& object) { return object.kind() == Kind::PathExpr; }
   [[nodiscard]] static Ref<XQueryPathExpr> pathExprWithStep(Ref<XQueryStep> step);
   XQueryStep* step() const { return _step.get(); }
+  // The chain of steps does not change afterwards.
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value evaluateWithContext(XQueryContext& context) const override;
 
@@ -143,6 +191,8 @@ class XQueryPathExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  Value evaluateSteps(XQueryContext& context) const;
+
   Ref<XQueryStep> _step;
 };
 

@@ -2,14 +2,17 @@
 //
 // While nodes of one tree arrive in strictly ascending document order, which is nearly always, the
 // order itself proves that they are distinct and sorted: no identity set is kept and nothing is
-// sorted. The set is built from what has arrived at the first node that breaks the order.
+// sorted. Strictly descending order, as a reverse axis gives it, proves the same. The set is built
+// from what has arrived at the first node that breaks the order; a node equal to the one stored
+// last is a duplicate without breaking it.
 #pragma once
 
-#include <unordered_set>
-#include <vector>
-
+#include "Expr/IdentitySet.h"
+#include "xquery/Collection.h"
 #include "xquery/Object.h"
 #include "xquery/XMLNode.h"
+
+#include <vector>
 
 namespace xquery {
 
@@ -29,13 +32,21 @@ class XQueryPathResults {
 
  private:
   enum ItemType : int { NoneYet = 0, Nodes = 1, AtomicValues = 2 };
-  void addItem(NSObject* item, XQueryContext& context);
-  void store(NSObject* item);
-  void buildUnique();
+  // What is known of the items stored so far. One item is in any order.
+  enum class Arrival : uint8_t { AnyOrder, Ascending, Descending, Mixed };
 
-  std::vector<Value> _array;
-  std::unordered_set<const NSObject*> _unique;
-  bool _ascending = true;  // strictly, and then _unique is not in use
+  void addItem(NSObject* item, XQueryContext& context);
+  bool continuesOrder(const NSXMLNode* node);
+  void append(NSObject* item);
+  void storeNode(NSXMLNode* node);
+  void storeByIdentity(NSObject* item);
+  void sort(std::vector<Value>& nodes);
+
+  Value _firstResult;   // the only item
+  Ref<NSArray> _array;  // two or more items
+  NSObject* _lastStored = nullptr;
+  XQueryIdentitySet _unique;  // in use while the arrival is mixed
+  Arrival _arrival = Arrival::AnyOrder;
   bool _isReversed = false;
   ItemType _type = NoneYet;
 };

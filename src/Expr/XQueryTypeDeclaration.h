@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Expr/XQueryExpr.h"
+#include "Types/XQueryTypeTable.h"
 
 namespace xquery {
 
@@ -41,7 +42,12 @@ class XQueryTypeDeclaration : public XQueryExpr {
   [[nodiscard]] static Ref<XQueryTypeDeclaration> anyKind();
 
   int type() const { return _type; }
+  // For an atomic type its name: lexical until bound, then an XQueryQName.
   NSObject* data() const { return _data.get(); }
+  // The built-in type that a bound atomic declaration names; 0 when it names none.
+  XQueryTypeID typeID() const { return _typeID; }
+  // Whether the occurrence indicator lets a sequence of so many items pass.
+  bool acceptsCount(size_t count) const;
   int32_t occuranceType() const { return _occuranceType; }
   void setOccuranceType(int32_t occuranceType) { _occuranceType = occuranceType; }
 
@@ -52,8 +58,11 @@ class XQueryTypeDeclaration : public XQueryExpr {
   XQueryTypeDeclaration(int type, Value data);
 
  private:
+  void setData(Value data);
+
   int _type;
   int32_t _occuranceType = ExactlyOne;
+  XQueryTypeID _typeID = XQueryTypeNone;
   Value _data;
 };
 

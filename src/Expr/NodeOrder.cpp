@@ -1,0 +1,208 @@
+// Document order between nodes.
+//
+// The order is defined by climbing: from two nodes up to the children of their nearest common
+// ancestor, whose positions decide. Nodes of one tree carry preorder numbers that give the same
+// answer by comparing two integers: an element comes before its namespaces, those before its
+// attributes, those before its children, and an ancestor before its descendants. Climbing is left
+// for nodes of different trees, which are neither before nor after each other, except that a node
+// without a parent is before every node that has one.
+//
+// That exception and the lack of an order between trees make the relation no total order, so the
+// sorts over several trees are merge sorts of our own: they stay within their array and keep what
+// cannot be compared in the order in which it stands, whatever the comparator answers.
+#include "Expr/NodeOrder.h"
+
+#include "xquery/Number.h"
+
+#include <algorithm>
+#include <cstdint>
+
+namespace xquery {
+namespace {
+
+// Two nodes on their way up to the children of a common ancestor.
+struct Climb {
+  const NSXMLNode* a;
+  const NSXMLNode* b;
+  const NSXMLNode* parentOfA;
+  const NSXMLNode* parentOfB;
+
+  void climbA() {
+    a = parentOfA;
+    parentOfA = parentOfA->parent();
+  }
+  void climbB() {
+    b = parentOfB;
+    parentOfB = parentOfB->parent();
+  }
+};
+
+enum class Position { Before, After, Neither };
+
+// Where `a` stands from `b`, for two nodes that both have a parent or both have none.
+Position positionByClimbing(const NSXMLNode* a, const NSXMLNode* b) {
+  Climb at{a, b, a->parent(), b->parent()};
+  if (at.parentOfA != at.parentOfB) {
+    int64_t levelOfA = at.parentOfA->level();
+    int64_t levelOfB = at.parentOfB->level();
+    for (; levelOfA > levelOfB; --levelOfA) {
+      if (at.parentOfA == b) return Position::After;
+      at.climbA();
+    }
+    for (; levelOfB > levelOfA; --levelOfB) {
+      if (at.parentOfB == at.a) return Position::Before;
+      at.climbB();
+    }
+    while (at.parentOfA != at.parentOfB) {
+      at.climbA();
+      at.climbB();
+      if (!at.parentOfA || !at.parentOfB) return Position::Neither;
+    }
+  }
+  const int64_t indexOfA = at.a->index();
+  const int64_t indexOfB = at.b->index();
+  if (indexOfA == indexOfB) return Position::Neither;
+  return indexOfA < indexOfB ? Position::Before : Position::After;
+}
+
+// Sorts so that no element stands after one that it is `before`, as far as the relation allows.
+// Stable, and safe with a relation that is no order at all.
+template <class T, class Before>
+void mergeSort(std::vector<T>& items, Before before) {
+  std::vector<T> merged(items.size());
+  for (size_t width = 1; width < items.size(); width *= 2) {
+    for (size_t start = 0; start < items.size(); start += 2 * width) {
+      const size_t middle = std::min(start + width, items.size());
+      const size_t end = std::min(start + 2 * width, items.size());
+      size_t left = start;
+      size_t right = middle;
+      for (size_t out = start; out < end; ++out) {
+        const bool takeRight = left == middle || (right < end && before(items[right], items[left]));
+        merged[out] = std::move(items[takeRight ? right++ : left++]);
+      }
+    }
+    items.swap(merged);
+  }
+}
+
+const NSXMLNode* nodeOf(const Value& value) {
+  return cast<NSXMLNode>(value);
+}
+
+// Being comparable is transitive, so neighbours decide for all.
+bool allComparable(const std::vector<Value>& nodes) {
+  for (size_t i = 1; i < nodes.size(); ++i) {
+    if (!NSXMLNode::haveComparableOrder(nodeOf(nodes[i - 1]), nodeOf(nodes[i]))) return false;
+  }
+  return true;
+}
+
+void sortByOrderNumber(std::vector<Value>& nodes) {
+  struct Numbered {
+    uint32_t number;
+    Value node;
+  };
+  std::vector<Numbered> numbered;
+  numbered.reserve(nodes.size());
+  for (Value& node : nodes) {
+    const uint32_t number = nodeOf(node)->orderNumber();
+    numbered.push_back({number, std::move(node)});
+  }
+  std::sort(numbered.begin(), numbered.end(),
+            [](const Numbered& a, const Numbered& b) { return a.number < b.number; });
+  for (size_t i = 0; i < nodes.size(); ++i) nodes[i] = std::move(numbered[i].node);
+}
+
+}  // namespace
+
+bool XQueryNodeBeforeByClimbing(const NSXMLNode* a, const NSXMLNode* b) {
+  if (a == b) return false;
+  if (a->parent() != b->parent()) {
+    if (!a->parent()) return true;
+    if (!b->parent()) return false;
+  }
+  return positionByClimbing(a, b) == Position::Before;
+}
+
+bool XQueryNodeAfterByClimbing(const NSXMLNode* a, const NSXMLNode* b) {
+  if (a == b) return false;
+  if (a->parent() != b->parent()) {
+    if (!a->parent()) return false;
+    if (!b->parent()) return true;
+  }
+  return positionByClimbing(a, b) == Position::After;
+}
+
+bool XQueryNodeBefore(const NSXMLNode* a, const NSXMLNode* b) {
+  if (NSXMLNode::haveComparableOrder(a, b)) return a->orderNumber() < b->orderNumber();
+  return XQueryNodeBeforeByClimbing(a, b);
+}
+
+bool XQueryNodeAfter(const NSXMLNode* a, const NSXMLNode* b) {
+  if (NSXMLNode::haveComparableOrder(a, b)) return a->orderNumber() > b->orderNumber();
+  return XQueryNodeAfterByClimbing(a, b);
+}
+
+Value op_node_before(const NSXMLNode* a, const NSXMLNode* b) {
+  return NSNumber::numberWithBool(XQueryNodeBefore(a, b));
+}
+
+Value op_node_after(const NSXMLNode* a, const NSXMLNode* b) {
+  return NSNumber::numberWithBool(XQueryNodeAfter(a, b));
+}
+
+int NodeDocOrderCompareForward(const NSXMLNode* a, const NSXMLNode* b) {
+  if (a == b) return 0;
+  return XQueryNodeBefore(a, b) ? -1 : 1;
+}
+
+int NodeDocOrderCompareReverse(const NSXMLNode* a, const NSXMLNode* b) {
+  if (a == b) return 0;
+  return XQueryNodeAfter(a, b) ? -1 : 1;
+}
+
+void XQuerySortNodesForward(std::vector<Value>& nodes) {
+  if (allComparable(nodes)) {
+    sortByOrderNumber(nodes);
+  } else {
+    mergeSort(nodes, [](const Value& a, const Value& b) {
+      return NodeDocOrderCompareForward(nodeOf(a), nodeOf(b)) < 0;
+    });
+  }
+}
+
+void XQuerySortNodesReverse(std::vector<Value>& nodes) {
+  if (allComparable(nodes)) {
+    sortByOrderNumber(nodes);
+    std::reverse(nodes.begin(), nodes.end());
+  } else {
+    mergeSort(nodes, [](const Value& a, const Value& b) {
+      return NodeDocOrderCompareReverse(nodeOf(a), nodeOf(b)) < 0;
+    });
+  }
+}
+
+void XQuerySortNodesForwardStable(std::vector<Value>& nodes) {
+  if (allComparable(nodes)) {
+    sortByOrderNumber(nodes);
+    return;
+  }
+  struct Placed {
+    Value node;
+    const NSXMLNode* root = nullptr;
+    size_t place = 0;
+  };
+  std::vector<Placed> placed;
+  placed.reserve(nodes.size());
+  for (Value& node : nodes) {
+    const NSXMLNode* root = nodeOf(node)->rootNode();
+    placed.push_back({std::move(node), root, placed.size()});
+  }
+  mergeSort(placed, [](const Placed& a, const Placed& b) {
+    if (a.root != b.root) return a.place < b.place;
+    return NodeDocOrderCompareForward(nodeOf(a.node), nodeOf(b.node)) < 0;
+  });
+  for (size_t i = 0; i < nodes.size(); ++i) nodes[i] = std::move(placed[i].node);
+}
+
+}  // namespace xquery

@@ -1,0 +1,116 @@
+// The twelve axes.
+//
+// XQueryWalkAxis visits the nodes on an axis of a node, in the order in which a path sees them:
+// document order for the forward axes and for preceding, nearest first for the other reverse axes.
+// The visitor answers whether the walk goes on. Nothing is allocated, except that the preceding
+// axis keeps the list of the node's ancestors.
+#pragma once
+
+#include "Expr/XQueryPath.h"
+#include "xquery/XMLNode.h"
+
+#include <vector>
+
+namespace xquery {
+
+// The node at which the descendant axis ends: the next sibling or, without one, the parent's. Null
+// lets the walk run to the end of the document, past the node's own descendants when the node is
+// the last child of a last child.
+NSXMLNode* XQueryDescendantStop(const NSXMLNode* node);
+
+// The node with which the following axis begins; null when there is none.
+NSXMLNode* XQueryFollowingStart(const NSXMLNode* node);
+
+// The ancestors of a node, the root last.
+std::vector<const NSXMLNode*> XQueryAncestors(const NSXMLNode* node);
+
+// Visits `first` and each node after it in document order, up to (excluding) `stop`.
+template <class Visit>
+void XQueryWalkNodes(NSXMLNode* first, const NSXMLNode* stop, Visit& visit) {
+  for (NSXMLNode* node = first; node && node != stop; node = node->nextNode()) {
+    if (!visit(node)) return;
+  }
+}
+
+// An attribute or namespace node is in nobody's order of next nodes: its walk ends at its parent
+// element.
+template <class Visit>
+void XQueryWalkPreceding(NSXMLNode* node, Visit& visit) {
+  NSXMLNode* root = node->rootNode();
+  if (!root || root == node) return;
+  std::vector<const NSXMLNode*> ancestors = XQueryAncestors(node);
+  const bool isChild = node->kind() != Kind::Attribute && node->kind() != Kind::Namespace;
+  auto visitUnlessAncestor = [&](NSXMLNode* candidate) {
+    // The walk meets the ancestors from the root downwards.
+    if (!ancestors.empty() && candidate == ancestors.back()) {
+      ancestors.pop_back();
+      return true;
+    }
+    return visit(candidate);
+  };
+  XQueryWalkNodes(root, isChild ? node : node->parent(), visitUnlessAncestor);
+}
+
+template <class Visit>
+void XQueryWalkAncestors(NSXMLNode* first, Visit& visit) {
+  for (NSXMLNode* node = first; node; node = node->parent()) {
+    if (!visit(node)) return;
+  }
+}
+
+template <class Visit>
+void XQueryWalkAttributes(NSXMLNode* node, Visit& visit) {
+  const auto* element = dyn_cast<NSXMLElement>(node);
+  if (!element) return;
+  for (NSXMLNode* attribute = element->firstAttribute(); attribute;
+       attribute = NSXMLElement::nextAttribute(attribute)) {
+    if (!visit(attribute)) return;
+  }
+}
+
+template <class Visit>
+void XQueryWalkAxis(NSXMLNode* node, int axis, Visit visit) {
+  switch (axis) {
+    case XQueryAxisChild:
+      for (NSXMLNode* child = node->firstChild(); child; child = child->nextSibling()) {
+        if (!visit(child)) return;
+      }
+      return;
+    case XQueryAxisDescendant:
+      return XQueryWalkNodes(node->nextNode(), XQueryDescendantStop(node), visit);
+    case XQueryAxisDescendantOrSelf:
+      if (visit(node)) XQueryWalkNodes(node->nextNode(), XQueryDescendantStop(node), visit);
+      return;
+    case XQueryAxisAttribute:
+      return XQueryWalkAttributes(node, visit);
+    case XQueryAxisSelf:
+      visit(node);
+      return;
+    case XQueryAxisFollowingSibling:
+      for (NSXMLNode* next = node->nextSibling(); next; next = next->nextSibling()) {
+        if (!visit(next)) return;
+      }
+      return;
+    case XQueryAxisFollowing:
+      return XQueryWalkNodes(XQueryFollowingStart(node), nullptr, visit);
+    case XQueryAxisAncestor:
+      return XQueryWalkAncestors(node->parent(), visit);
+    case XQueryAxisParent:
+      if (node->parent()) visit(node->parent());
+      return;
+    case XQueryAxisPreceding:
+      return XQueryWalkPreceding(node, visit);
+    case XQueryAxisPrecedingSibling:
+      for (NSXMLNode* previous = node->previousSibling(); previous;
+           previous = previous->previousSibling()) {
+        if (!visit(previous)) return;
+      }
+      return;
+    case XQueryAxisAncestorOrSelf:
+      return XQueryWalkAncestors(node, visit);
+    default:  // no such axis: nothing is walked
+      return;
+  }
+}
+
+}  // namespace xquery

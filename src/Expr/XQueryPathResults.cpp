@@ -1,0 +1,113 @@
+#include "Expr/XQueryPathResults.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/NodeOrder.h"
+#include "Expr/XQuerySequence.h"
+#include "Types/XQueryTypeTable.h"
+
+#include <algorithm>
+
+namespace xquery {
+namespace {
+
+[[noreturn]] void raiseWrongItem(std::string_view message, XQueryContext& context) {
+  context._internal().raise(XQueryError::error(19, message));
+}
+
+}  // namespace
+
+void XQueryPathResults::add(const NSObject* value, XQueryContext& context) {
+  const XQueryItemList items(value);
+  for (size_t i = 0; i < items.count(); ++i) {
+    if (!items[i]) return;
+    addItem(items[i], context);
+  }
+}
+
+void XQueryPathResults::addItem(NSObject* item, XQueryContext& context) {
+  if (auto* node = dyn_cast<NSXMLNode>(item)) {
+    addNode(node, context);
+  } else if (XQueryIsAtomicType(item)) {
+    if (_type == Nodes) raiseWrongItem("item not a node", context);
+    _type = AtomicValues;
+    storeByIdentity(item);
+  } else {
+    raiseWrongItem("item not a node or atomic type", context);
+  }
+}
+
+void XQueryPathResults::addNode(NSXMLNode* node, XQueryContext& context) {
+  // The text is cut short; callers know it so.
+  if (_type == AtomicValues) raiseWrongItem("item not an atomic typ", context);
+  _type = Nodes;
+  storeNode(node);
+}
+
+void XQueryPathResults::storeNode(NSXMLNode* node) {
+  if (node == _lastStored) return;
+  if (!_lastStored || (_arrival != Arrival::Mixed && continuesOrder(node))) {
+    append(node);
+  } else {
+    storeByIdentity(node);
+  }
+}
+
+bool XQueryPathResults::continuesOrder(const NSXMLNode* node) {
+  const auto* last = cast<NSXMLNode>(_lastStored);
+  if (!NSXMLNode::haveComparableOrder(last, node)) return false;
+  const Arrival step =
+      last->orderNumber() < node->orderNumber() ? Arrival::Ascending : Arrival::Descending;
+  if (_arrival == Arrival::AnyOrder) _arrival = step;
+  return _arrival == step;
+}
+
+void XQueryPathResults::storeByIdentity(NSObject* item) {
+  if (item == _lastStored) return;
+  if (_lastStored && _arrival != Arrival::Mixed) {
+    _arrival = Arrival::Mixed;
+    if (_firstResult) _unique.insert(_firstResult.get());
+    if (_array) {
+      for (const Value& stored : _array->objects()) _unique.insert(stored.get());
+    }
+  }
+  if (_lastStored && !_unique.insert(item)) return;
+  append(item);
+}
+
+void XQueryPathResults::append(NSObject* item) {
+  _lastStored = item;
+  if (_array) {
+    _array->objects().push_back(Value(item));
+  } else if (_firstResult) {
+    _array = NSArray::array();
+    _array->objects().reserve(8);
+    _array->objects().push_back(std::move(_firstResult));
+    _array->objects().push_back(Value(item));
+  } else {
+    _firstResult = Value(item);
+  }
+}
+
+Value XQueryPathResults::value(bool ordered) {
+  if (_firstResult) return _firstResult;
+  if (!_array) return NSNull::null();
+  if (ordered && _type == Nodes) sort(_array->objects());
+  return _array;
+}
+
+void XQueryPathResults::sort(std::vector<Value>& nodes) {
+  const Arrival wanted = _isReversed ? Arrival::Descending : Arrival::Ascending;
+  if (_arrival == Arrival::Mixed) {
+    if (_isReversed) {
+      XQuerySortNodesReverse(nodes);
+    } else {
+      XQuerySortNodesForward(nodes);
+    }
+  } else if (_arrival != wanted) {
+    std::reverse(nodes.begin(), nodes.end());
+    _arrival = wanted;
+  }
+  _lastStored = nodes.back().get();
+}
+
+}  // namespace xquery

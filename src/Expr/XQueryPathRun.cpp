@@ -1,0 +1,115 @@
+#include "Expr/XQueryPathRun.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryPath.h"
+
+namespace xquery {
+namespace {
+
+constexpr uint32_t elementsAndAttributes =
+    XQueryKindBit(Kind::Element) | XQueryKindBit(Kind::Attribute);
+constexpr uint32_t namedKinds = elementsAndAttributes | XQueryKindBit(Kind::Namespace) |
+                                XQueryKindBit(Kind::ProcessingInstruction);
+constexpr uint32_t allKinds = namedKinds | XQueryKindBit(Kind::Document) |
+                              XQueryKindBit(Kind::Comment) | XQueryKindBit(Kind::Text);
+
+}  // namespace
+
+bool XQueryPathRun::contextHasDefaultNamespace() {
+  if (_defaultNamespace == DefaultNamespace::Unknown) {
+    _defaultNamespace = context._internal().contextNamespaceForPrefix(NSStringView())
+                            ? DefaultNamespace::Present
+                            : DefaultNamespace::None;
+  }
+  return _defaultNamespace == DefaultNamespace::Present;
+}
+
+const NSXMLExpandedName* XQueryPathRun::nameForDeferredTest(const XQueryNameTest& test) {
+  for (const auto& known : _deferredNames) {
+    if (known.first == &test) return known.second.get();
+  }
+  const Ref<XQueryQName> qName = test.qNameForContext(&context);
+  _deferredNames.emplace_back(&test,
+                              qName ? XQueryNameTest::interned(*qName) : NSXMLExpandedNameRef());
+  return _deferredNames.back().second.get();
+}
+
+std::vector<NSXMLNode*> XQueryPathRun::takeNodeList() {
+  if (_nodeLists.empty()) return {};
+  std::vector<NSXMLNode*> nodes = std::move(_nodeLists.back());
+  _nodeLists.pop_back();
+  nodes.clear();
+  return nodes;
+}
+
+XQueryNodeTest::XQueryNodeTest(const XQueryExpr* expr, XQueryPathRun& run)
+    : _expr(expr), _run(run) {
+  switch (expr ? expr->kind() : Kind::None) {
+    case Kind::NameTest:
+      setNameTest(*cast<XQueryNameTest>(expr));
+      break;
+    case Kind::WildCardNameTest:
+      setWildCard(*cast<XQueryWildCardNameTest>(expr));
+      break;
+    case Kind::TypeDeclaration:
+      setKindTest(*cast<XQueryTypeDeclaration>(expr));
+      break;
+    default:  // matches nothing
+      break;
+  }
+}
+
+void XQueryNodeTest::setNameTest(const XQueryNameTest& test) {
+  _name = test.boundName();
+  if (!_name && test.nameWithoutNamespace() && !_run.contextHasDefaultNamespace()) {
+    _name = test.nameWithoutNamespace();
+  }
+  if (_name) {
+    accept(elementsAndAttributes);
+  } else {
+    ask(elementsAndAttributes);
+  }
+}
+
+// The full wildcard asks only for a name.
+void XQueryNodeTest::setWildCard(const XQueryWildCardNameTest& test) {
+  if (test.prefix() || test.localName()) {
+    ask(namedKinds);
+  } else {
+    accept(namedKinds);
+  }
+}
+
+// One node is one item: an occurrence indicator accepts it or not, whichever node it is.
+void XQueryNodeTest::setKindTest(const XQueryTypeDeclaration& test) {
+  if (!test.acceptsCount(1)) return;
+  const bool hasData = test.data() != nullptr;
+  switch (test.type()) {
+    case XQueryTypeDeclaration::AnyKindTest:
+      return accept(hasData ? 0 : allKinds);
+    case XQueryTypeDeclaration::TextTest:
+      return accept(hasData ? 0 : XQueryKindBit(Kind::Text));
+    case XQueryTypeDeclaration::CommentTest:
+      return accept(hasData ? 0 : XQueryKindBit(Kind::Comment));
+    case XQueryTypeDeclaration::DocumentTest:
+      return accept(hasData ? 0 : XQueryKindBit(Kind::Document));
+    case XQueryTypeDeclaration::ElementTest:
+      return hasData ? ask(XQueryKindBit(Kind::Element)) : accept(XQueryKindBit(Kind::Element));
+    case XQueryTypeDeclaration::AttributeTest:
+      return hasData ? ask(XQueryKindBit(Kind::Attribute)) : accept(XQueryKindBit(Kind::Attribute));
+    default:
+      return ask(allKinds);
+  }
+}
+
+bool XQueryNodeTest::matchesFurther(const NSXMLNode* node) {
+  const auto* nameTest = dyn_cast<XQueryNameTest>(_expr);
+  if (!nameTest || !nameTest->isDeferred()) {
+    return XQueryAxisStep::isValid(node, _expr, _run.context);
+  }
+  _name = _run.nameForDeferredTest(*nameTest);
+  if (!_name) _kinds = 0;
+  return _name && node->expandedName() == _name;
+}
+
+}  // namespace xquery

@@ -1,0 +1,80 @@
+// What one evaluation of a path carries from step to step, and a step's node test made ready for
+// its nodes.
+#pragma once
+
+#include "Expr/XQueryNameTest.h"
+#include "Expr/XQueryPathResults.h"
+#include "Expr/XQueryTypeDeclaration.h"
+#include "xquery/XMLNode.h"
+
+#include <cstdint>
+#include <utility>
+#include <vector>
+
+namespace xquery {
+
+class XQueryPathRun {
+ public:
+  XQueryPathRun(XQueryPathResults& toResults, XQueryContext& forContext)
+      : results(toResults), context(forContext) {}
+
+  XQueryPathResults& results;
+  XQueryContext& context;
+  // An axis step makes each of its context items the focus. Nobody can see that focus, except where
+  // an error leaves it behind, so it is left out unless an error may arise from the items.
+  bool setsEveryFocus = true;
+  // The results will be sorted, so the order in which nodes arrive is free.
+  bool orderIsFree = false;
+
+  bool contextHasDefaultNamespace();
+  // The interned name of a deferred test; resolved once (which may raise) and kept while the path
+  // is evaluated. Null for a name that no node can have.
+  const NSXMLExpandedName* nameForDeferredTest(const XQueryNameTest& test);
+
+  // Lists of nodes, used again by the next step with predicates.
+  std::vector<NSXMLNode*> takeNodeList();
+  void returnNodeList(std::vector<NSXMLNode*> nodes) { _nodeLists.push_back(std::move(nodes)); }
+
+ private:
+  enum class DefaultNamespace : uint8_t { Unknown, None, Present };
+
+  std::vector<std::pair<const XQueryNameTest*, NSXMLExpandedNameRef>> _deferredNames;
+  std::vector<std::vector<NSXMLNode*>> _nodeLists;
+  DefaultNamespace _defaultNamespace = DefaultNamespace::Unknown;
+};
+
+// A set of node kinds as bits.
+constexpr uint32_t XQueryKindBit(Kind kind) { return 1U << static_cast<unsigned>(kind); }
+
+// A node test in the form that is quickest to ask: the kinds of node it accepts as bits and, for a
+// name, the interned name. It answers as XQueryAxisStep::isValid does; what the two words cannot
+// say is asked there.
+class XQueryNodeTest {
+ public:
+  XQueryNodeTest(const XQueryExpr* expr, XQueryPathRun& run);
+
+  bool matches(const NSXMLNode* node) {
+    if ((_kinds & XQueryKindBit(node->kind())) == 0) return false;
+    if (_name) return node->expandedName() == _name;
+    return !_askFurther || matchesFurther(node);
+  }
+
+ private:
+  void setNameTest(const XQueryNameTest& test);
+  void setWildCard(const XQueryWildCardNameTest& test);
+  void setKindTest(const XQueryTypeDeclaration& test);
+  void accept(uint32_t kinds) { _kinds = kinds; }
+  void ask(uint32_t kinds) {
+    _kinds = kinds;
+    _askFurther = true;
+  }
+  bool matchesFurther(const NSXMLNode* node);
+
+  const XQueryExpr* _expr;
+  XQueryPathRun& _run;
+  const NSXMLExpandedName* _name = nullptr;
+  uint32_t _kinds = 0;
+  bool _askFurther = false;
+};
+
+}  // namespace xquery

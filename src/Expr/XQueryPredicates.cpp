@@ -1,0 +1,133 @@
+// Predicates of path steps.
+//
+// A numeric literal selects by position and is never evaluated. Any other predicate is evaluated
+// once per item with the item as focus; a number selects by position, anything else by its truth.
+// An error in a predicate drops the item it arose for and nothing more: a path over irregular data
+// keeps what fits. Reaching an engine limit is no such error and ends the evaluation.
+#include "Eval/StackGuard.h"
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryLists.h"
+#include "Expr/XQueryPath.h"
+#include "Expr/XQuerySequence.h"
+#include "Types/XQueryAtomization.h"
+#include "Types/XQueryNumber.h"
+#include "Types/XQueryTypeTable.h"
+
+#include <algorithm>
+
+namespace xquery {
+namespace {
+
+// The literal that a predicate is, or holds as its only element.
+const XQueryLiteral* literalIn(const XQueryExpr* predicate) {
+  const auto* list = dyn_cast<XQueryExprList>(predicate);
+  if (list && list->count() == 1) predicate = list->objectAtIndex(0);
+  return dyn_cast<XQueryLiteral>(predicate);
+}
+
+Value itemAtPosition(const Value& items, uint64_t position) {
+  if (isNull(items) || position == 0) return NSNull::null();
+  if (const auto* array = dyn_cast<NSArray>(items)) {
+    return position <= array->count() ? array->objects()[position - 1] : NSNull::null();
+  }
+  return position == 1 ? items : NSNull::null();
+}
+
+bool isLimit(const XQueryError* error) {
+  return error && error->err() == 0 && error->msg() &&
+         error->msg()->view().startsWith(NSStringView::ascii("limit: "));
+}
+
+// A fraction is cut off, so that 2.5 selects the second item.
+bool selects(const Value& result, int64_t position, XQueryContext& context) {
+  if (!result) return false;
+  if (XQueryIsNumericType(result.get())) {
+    const auto* number = cast<NSNumber>(result);
+    return number->compare(*XQueryNumber::zero()) > 0 &&
+           number->unsignedIntegerValue() == static_cast<uint64_t>(position);
+  }
+  return XQueryIsTrue(XQueryEffectiveBooleanValue(result, context));
+}
+
+// Whether the predicate keeps the item at the position.
+bool keeps(const XQueryExpr& predicate, NSObject* item, int64_t position, XQueryContext& context) {
+  auto& dynamic = context._internal();
+  dynamic.setContextItem(item, position);
+  try {
+    return selects(predicate.evaluateWithContext(context), position, context);
+  } catch (const NSException&) {
+    if (isLimit(dynamic.error().get())) throw;
+    dynamic.setError(nullptr, false);
+    return false;
+  }
+}
+
+Value keptItems(const Value& items, const XQueryExpr& predicate, XQueryContext& context) {
+  const XQueryItemList list(items.get());
+  context._internal().setLast(static_cast<int64_t>(list.count()));
+  XQueryGatherer kept;
+  for (size_t i = 0; i < list.count(); ++i) {
+    NSObject* item = list[i];
+    const bool isKept = keeps(predicate, item, static_cast<int64_t>(i) + 1, context);
+    if (isKept && item && item->kind() != Kind::Null) kept.add(item);
+  }
+  return kept.value();
+}
+
+void keepNodes(std::vector<NSXMLNode*>& nodes, const XQueryExpr& predicate,
+               XQueryContext& context) {
+  context._internal().setLast(static_cast<int64_t>(nodes.size()));
+  size_t kept = 0;
+  for (size_t i = 0; i < nodes.size(); ++i) {
+    NSXMLNode* node = nodes[i];
+    if (keeps(predicate, node, static_cast<int64_t>(i) + 1, context)) nodes[kept++] = node;
+  }
+  nodes.resize(kept);
+}
+
+}  // namespace
+
+std::optional<uint64_t> XQueryStep::literalPosition(size_t index) const {
+  const XQueryLiteral* literal = literalIn(_predicates[index].get());
+  if (!literal || !XQueryIsNumericType(literal->literalValue().get())) return std::nullopt;
+  return cast<NSNumber>(literal->literalValue())->unsignedIntegerValue();
+}
+
+bool XQueryStep::hasOnlyLiteralPositions() const {
+  for (size_t i = 0; i < _predicates.size(); ++i) {
+    if (!literalPosition(i)) return false;
+  }
+  return true;
+}
+
+Value XQueryStep::handlePreicatesFromIndex(size_t index, Value items,
+                                           XQueryContext& context) const {
+  for (; index < _predicates.size() && items; ++index) {
+    const XQueryExpr* predicate = _predicates[index].get();
+    if (!predicate) break;
+    if (const auto position = literalPosition(index)) {
+      items = itemAtPosition(items, *position);
+    } else {
+      items = keptItems(items, *predicate, context);
+    }
+  }
+  return items;
+}
+
+void XQueryStep::filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex,
+                             XQueryContext& context) const {
+  for (size_t index = fromIndex; index < _predicates.size(); ++index) {
+    const XQueryExpr* predicate = _predicates[index].get();
+    if (!predicate) break;
+    if (const auto position = literalPosition(index)) {
+      const bool isThere = *position >= 1 && *position <= nodes.size();
+      if (isThere) nodes[0] = nodes[*position - 1];
+      nodes.resize(isThere ? 1 : 0);
+    } else {
+      keepNodes(nodes, *predicate, context);
+    }
+  }
+}
+
+}  // namespace xquery
