@@ -44,7 +44,9 @@ class XQueryPathRun {
 };
 
 // A set of node kinds as bits.
-constexpr uint32_t XQueryKindBit(Kind kind) { return 1U << static_cast<unsigned>(kind); }
+constexpr uint32_t XQueryKindBit(Kind kind) {
+  return 1U << static_cast<unsigned>(kind);
+}
 
 // A node test in the form that is quickest to ask: the kinds of node it accepts as bits and, for a
 // name, the interned name. It answers as XQueryAxisStep::isValid does; what the two words cannot
