@@ -2,7 +2,6 @@
 
 #include "Prolog/XQueryProlog.h"
 
-#include <algorithm>
 #include <array>
 #include <string_view>
 
@@ -94,14 +93,13 @@ void XQueryModules::addProlog(Ref<XQueryProlog> prolog, int64_t forID) {
   const auto index = static_cast<size_t>(forID);
   if (index >= _prologs.size()) _prologs.resize(index + 1);
   _prologs[index] = prolog.get();
-  if (prolog->ownsModules(*this)) return;
-  prolog->disownModules(*this);
-  _ownedPrologs.push_back(std::move(prolog));
+  if (!prolog->madeModules(*this)) _ownedPrologs.push_back(std::move(prolog));
 }
 
-void XQueryModules::forgetProlog(const XQueryProlog& prolog) {
-  std::replace(_prologs.begin(), _prologs.end(), const_cast<XQueryProlog*>(&prolog),
-               static_cast<XQueryProlog*>(nullptr));
+void XQueryModules::removePrologs() {
+  _prologs.clear();
+  // The registry may go with the last of them.
+  const auto removed = std::move(_ownedPrologs);
 }
 
 }  // namespace xquery

@@ -1,9 +1,9 @@
 // Namespace IDs of one compilation, and the library modules it loaded.
 //
-// Who keeps whom: the prolog for which no registry existed makes one and owns it; the registry owns
-// the library prologs that register with it, and those only point back. So a main module and all it
-// loaded go together, and no cycle of references keeps any of it. A library prolog that is replaced
-// under its ID is kept as well, for others may have copied its declarations by then.
+// Who keeps whom: every prolog owns its registry, and the registry owns the library prologs that
+// register with it. The cycle is broken by the prolog that made the registry, the main module's:
+// the registry only points at that one, and is emptied by it when it goes. A library prolog that is
+// replaced under its ID is kept as well, for others may have copied its declarations by then.
 #pragma once
 
 #include "Prolog/StringTable.h"
@@ -45,10 +45,9 @@ class XQueryModules : public NSCounted {
   int64_t namespaceID(const Ref<NSString>& URI, bool canCreate);
   // Null for an ID below 1, past the end, and where no prolog was added.
   XQueryProlog* prologForID(int64_t id) const;
-  // Replaces what was there. A prolog added to its own registry must not be used after it.
+  // Replaces what was there.
   void addProlog(Ref<XQueryProlog> prolog, int64_t forID);
-  // For the prolog that owns this registry, when it goes.
-  void forgetProlog(const XQueryProlog& prolog);
+  void removePrologs();
 
  protected:
   XQueryModules();

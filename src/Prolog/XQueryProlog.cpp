@@ -72,14 +72,12 @@ bool isBuiltinID(int64_t id) {
 
 XQueryProlog::XQueryProlog(Ref<XQueryModules> modules)
     : NSCounted(Kind::Prolog),
-      _ownedModules(modules ? modules : XQueryModules::modules()),
+      _modules(modules ? modules : XQueryModules::modules()),
       _madeModules(!modules),
-      _namespacePrefixes(predeclaredSlots().begin(), predeclaredSlots().end()) {
-  _modules = _ownedModules.get();
-}
+      _namespacePrefixes(predeclaredSlots().begin(), predeclaredSlots().end()) {}
 
 XQueryProlog::~XQueryProlog() {
-  if (_madeModules) _modules->forgetProlog(*this);
+  if (_madeModules) _modules->removePrologs();
 }
 
 Ref<XQueryProlog> XQueryProlog::prologWithItems(const std::vector<Ref<XQueryPrologItem>>& items,
@@ -102,12 +100,8 @@ Ref<XQueryProlog> XQueryProlog::prologWithItems(const std::vector<Ref<XQueryProl
   return prolog;
 }
 
-bool XQueryProlog::ownsModules(const XQueryModules& modules) const {
+bool XQueryProlog::madeModules(const XQueryModules& modules) const {
   return _madeModules && _modules == &modules;
-}
-
-void XQueryProlog::disownModules(const XQueryModules& modules) {
-  if (_modules == &modules) _ownedModules = nullptr;
 }
 
 void XQueryProlog::_addItems(const std::vector<Ref<XQueryPrologItem>>& items) {

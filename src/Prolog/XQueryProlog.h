@@ -145,10 +145,8 @@ class XQueryProlog : public NSCounted {
   // For diagnostics.
   Ref<NSString> description() const;
 
-  // Whether this prolog made and owns the registry.
-  bool ownsModules(const XQueryModules& modules) const;
-  // The registry owns this prolog from now on.
-  void disownModules(const XQueryModules& modules);
+  // Whether this prolog made the registry, having been given none.
+  bool madeModules(const XQueryModules& modules) const;
 
   // Without a registry it makes one.
   explicit XQueryProlog(Ref<XQueryModules> modules = nullptr);
@@ -169,8 +167,7 @@ class XQueryProlog : public NSCounted {
     int64_t replacedID;  // 0: the name had none
   };
 
-  XQueryModules* _modules;
-  Ref<XQueryModules> _ownedModules;  // null once the registry owns this prolog
+  Ref<XQueryModules> _modules;
   bool _madeModules;
   Ref<NSString> _modulePrefix;
   Ref<NSString> _defaultCollation;

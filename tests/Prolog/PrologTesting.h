@@ -49,6 +49,21 @@ inline Ref<XQueryProlog> prologOf(const Items& items, const Ref<XQueryModules>& 
   return XQueryProlog::prologWithItems(items, nullptr, modules, nullptr);
 }
 
+// A registry that no main module made: emptied by hand.
+class OwnRegistry {
+ public:
+  OwnRegistry() = default;
+  OwnRegistry(const OwnRegistry&) = delete;
+  OwnRegistry& operator=(const OwnRegistry&) = delete;
+  ~OwnRegistry() { _modules->removePrologs(); }
+  operator const Ref<XQueryModules>&() const { return _modules; }
+  XQueryModules* operator->() const { return _modules.get(); }
+  XQueryModules* get() const { return _modules.get(); }
+
+ private:
+  Ref<XQueryModules> _modules = XQueryModules::modules();
+};
+
 inline Ref<XQueryPrologItem> moduleNamespace(std::string_view prefix, std::string_view URI) {
   return XQueryPrologItemModuleNamespace::moduleNamespace(text(URI), text(prefix), 0);
 }

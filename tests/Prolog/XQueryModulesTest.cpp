@@ -94,7 +94,7 @@ TEST(Modules, RegistriesAreIndependent) {
 }
 
 TEST(Modules, PrologsAreKeptByID) {
-  const auto modules = XQueryModules::modules();
+  const OwnRegistry modules;
   EXPECT_EQ(modules->prologForID(12), nullptr);
   const auto prolog = prologOf({});
   modules->addProlog(prolog, 13);
@@ -104,7 +104,7 @@ TEST(Modules, PrologsAreKeptByID) {
 }
 
 TEST(Modules, ALaterPrologReplacesTheOneBefore) {
-  const auto modules = XQueryModules::modules();
+  const OwnRegistry modules;
   const auto first = prologOf({moduleNamespace("m", "urn:m")}, modules);
   EXPECT_EQ(modules->prologForID(12), first.get());
   const auto second = prologOf({moduleNamespace("m", "urn:m")}, modules);
@@ -112,7 +112,7 @@ TEST(Modules, ALaterPrologReplacesTheOneBefore) {
 }
 
 TEST(Modules, AReplacedPrologLivesAsLongAsTheRegistry) {
-  const auto modules = XQueryModules::modules();
+  const OwnRegistry modules;
   const XQueryProlog* first = prologOf({moduleNamespace("m", "urn:m")}, modules).get();
   prologOf({moduleNamespace("m", "urn:m")}, modules);
   EXPECT_NE(modules->prologForID(12), first);
@@ -127,6 +127,18 @@ TEST(Modules, AModuleThatMadeTheRegistryIsForgottenWhenItGoes) {
     EXPECT_EQ(modules->prologForID(12), prolog.get());
   }
   EXPECT_EQ(modules->prologForID(12), nullptr);
+}
+
+TEST(Modules, APrologKeepsItsRegistry) {
+  Ref<XQueryProlog> module;
+  {
+    const auto main = prologOf({});
+    const Ref<XQueryModules> modules = &main->modules();
+    module = prologOf({moduleNamespace("m", "urn:m")}, modules);
+    EXPECT_EQ(modules->prologForID(12), module.get());
+  }
+  EXPECT_TRUE(module->hasOneReference());
+  EXPECT_EQ(module->namespaceID(text("urn:m")), 12);
 }
 
 TEST(Modules, BuiltinTablesCanBeReadByManyThreads) {

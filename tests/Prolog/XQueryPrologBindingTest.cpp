@@ -219,7 +219,7 @@ TEST(ModuleImport, WithoutANamespaceFindsNoModule) {
 
 class RegisteredModule : public testing::Test {
  protected:
-  Ref<XQueryModules> modules = XQueryModules::modules();
+  OwnRegistry modules;
 
   Ref<XQueryProlog> library(Items items) {
     items.insert(items.begin(), moduleNamespace("m", "urn:m"));

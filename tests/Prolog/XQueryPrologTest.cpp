@@ -54,7 +54,7 @@ TEST(Prolog, DefaultFunctionNamespaceIsTheStandardOneUntilDeclared) {
 }
 
 TEST(Prolog, KeepsLocationAndRegistry) {
-  const auto modules = XQueryModules::modules();
+  const OwnRegistry modules;
   const auto prolog = XQueryProlog::prologWithItems({}, text("file:///m.xq"), modules, nullptr);
   EXPECT_EQ(shown(prolog->location()), "file:///m.xq");
   EXPECT_EQ(&prolog->modules(), modules.get());
@@ -93,14 +93,14 @@ TEST(Prolog, ErrorsAreKeptInTheOrderFound) {
 }
 
 TEST(Prolog, LibraryModuleRegistersUnderItsNamespace) {
-  const auto modules = XQueryModules::modules();
+  const OwnRegistry modules;
   const auto prolog = prologOf({moduleNamespace("m", "urn:m")}, modules);
   EXPECT_TRUE(prolog->isModule());
   EXPECT_EQ(modules->prologForID(modules->namespaceID(text("urn:m"), false)), prolog.get());
 }
 
 TEST(Prolog, MainModuleDoesNotRegister) {
-  const auto modules = XQueryModules::modules();
+  const OwnRegistry modules;
   const auto prolog = prologOf({declareNamespace("m", "urn:m")}, modules);
   EXPECT_EQ(modules->prologForID(12), nullptr);
 }
