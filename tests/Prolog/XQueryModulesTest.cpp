@@ -3,6 +3,7 @@
 
 #include <gtest/gtest.h>
 
+#include <memory>
 #include <thread>
 
 namespace xquery {
@@ -139,6 +140,37 @@ TEST(Modules, APrologKeepsItsRegistry) {
   }
   EXPECT_TRUE(module->hasOneReference());
   EXPECT_EQ(module->namespaceID(text("urn:m")), 12);
+}
+
+// An expression that tells whether it still exists.
+Ref<XQueryExpr> witnessed(std::weak_ptr<int>& witness) {
+  auto token = std::make_shared<int>(0);
+  witness = token;
+  return probe([token](XQueryProlog&) {});
+}
+
+TEST(Modules, AMainModuleAndItsLibrariesGoTogether) {
+  std::weak_ptr<int> inMain;
+  std::weak_ptr<int> inLibrary;
+  {
+    const auto main = prologOf({variable("x", witnessed(inMain))});
+    const Ref<XQueryModules> modules = &main->modules();
+    prologOf({moduleNamespace("m", "urn:m"), variable("m:x", witnessed(inLibrary))}, modules);
+    EXPECT_FALSE(inMain.expired());
+    EXPECT_FALSE(inLibrary.expired());
+  }
+  EXPECT_TRUE(inMain.expired());
+  EXPECT_TRUE(inLibrary.expired());
+}
+
+TEST(Modules, ALibraryModuleCompiledAloneGoes) {
+  std::weak_ptr<int> witness;
+  {
+    const auto module =
+        prologOf({moduleNamespace("m", "urn:m"), variable("m:x", witnessed(witness))});
+    EXPECT_FALSE(witness.expired());
+  }
+  EXPECT_TRUE(witness.expired());
 }
 
 TEST(Modules, BuiltinTablesCanBeReadByManyThreads) {
