@@ -1,20 +1,30 @@
 // The XML tree.
 //
-// Nodes of one tree live in one arena (NSXMLTree) and are freed with it; a reference to any node
-// keeps its whole tree alive by one counter on the tree. Names are interned: two nodes have the
-// same expanded name exactly when their `expandedName` pointers are equal.
+// Nodes of one tree live in the blocks of one arena (NSXMLTree) and are freed with it; a reference
+// to any node keeps its whole tree alive by one counter on the tree. Names are interned: two nodes
+// have the same expanded name exactly when their `expandedName` pointers are equal.
 //
-//   common part (every node)         element                attribute         text, comment
-//     word   document order            previous sibling       name              previous sibling
-//     kind, flags, spare               first, last child      value, length     text, length
-//     tree                             name
-//     parent                           first attribute
-//     next sibling                     first namespace
-//     80 bytes at most                 56 at most             56 at most
+//   offset   element           attribute, namespace   text, comment, PI   document
+//    0       word: document order; kind; flags; distance from the head of the block, which names
+//            the tree
+//    8       parent            parent                 parent              (null)
+//   16       next sibling      next of the element    next sibling        (null)
+//   24       first child       text                   text                first child
+//   32       previous sibling  length of the text     previous sibling
+//   40       name              name                   length of the text
+//   48       first property                           name (PI only)      URI
+//            56 bytes          48 bytes               48 bytes, PI 56     56 bytes
+//
+// The properties of an element are one chain: its namespaces and then its attributes. The first
+// child's previous sibling field holds the last child.
 //
 // Adding a parentless node to another tree moves it: its identity stays, and the two arenas become
 // one. Reading a tree from several threads at once is safe while nobody changes it.
 #pragma once
+
+#include "xquery/Data.h"
+#include "xquery/Object.h"
+#include "xquery/String.h"
 
 #include <cstdint>
 #include <functional>
@@ -22,10 +32,6 @@
 #include <string>
 #include <string_view>
 #include <vector>
-
-#include "xquery/Data.h"
-#include "xquery/Object.h"
-#include "xquery/String.h"
 
 namespace xquery {
 
@@ -39,7 +45,30 @@ using NSXMLNodeKind = Kind;
 // counts as none).
 struct NSXMLExpandedName;
 // An interned qualified name as written: prefix, local name and URI.
-struct NSXMLName;
+struct NSXMLName {
+  const NSXMLExpandedName* expanded;
+  uint32_t references;
+  uint32_t prefixLength;  // without the colon
+  NSStringView text;      // prefix:local, or the local name alone
+  uint64_t hash;
+};
+
+// The head of a tree; the rest of it is the library's own.
+struct NSXMLTreeHead {
+  enum Order : uint8_t {
+    Fresh,         // one root, and all numbers are good
+    Stale,         // one root, numbers to be assigned anew
+    SeveralRoots,  // each root's own number tells whether the numbers under it are good
+  };
+  uint32_t references = 0;
+  uint8_t order = Fresh;
+};
+
+// The head of a piece of an arena.
+struct NSXMLBlock {
+  NSXMLTreeHead* tree;
+  uintptr_t next;  // the next block; in the low bits the block's own size class
+};
 
 // Parsing options; the bit numbers are part of the interface.
 enum NSXMLOptions : uint32_t {
@@ -65,26 +94,42 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
 
   // --- navigation: raw pointers, valid while the tree lives; all constant time unless said -------
   NSXMLNode* parent() const { return _parent; }
-  NSXMLNode* nextSibling() const;      // null for attributes and namespaces
-  NSXMLNode* previousSibling() const;  // null for attributes and namespaces
-  NSXMLNode* firstChild() const;       // null for anything but documents and elements
-  NSXMLNode* lastChild() const;
+  // Null for attributes and namespaces.
+  NSXMLNode* nextSibling() const { return isProperty() ? nullptr : _next; }
+  NSXMLNode* previousSibling() const {
+    return isProperty() || !_parent || !_previous->_next ? nullptr : _previous;
+  }
+  // Null for anything but documents and elements.
+  NSXMLNode* firstChild() const { return isBranch() ? _firstChild : nullptr; }
+  NSXMLNode* lastChild() const {
+    return isBranch() && _firstChild ? _firstChild->_previous : nullptr;
+  }
   // The next node in document order (attributes and namespaces apart); null at the end of the
   // document and for attributes and namespaces.
-  NSXMLNode* nextNode() const;
-  uint32_t childCount() const;                      // linear
-  NSXMLNode* childAtIndex(uint32_t index) const;    // linear in the index; null past the end
-  NSXMLDocument* rootDocument() const;              // the topmost node if it is a document
-  NSXMLNode* rootNode() const;                      // the topmost node
-  int64_t level() const;                            // number of ancestors
+  NSXMLNode* nextNode() const {
+    if (isBranch() && _firstChild) return _firstChild;
+    if (isProperty()) return nullptr;
+    for (const NSXMLNode* node = this; node; node = node->_parent) {
+      if (node->_next) return node->_next;
+    }
+    return nullptr;
+  }
+  uint32_t childCount() const;                    // linear
+  NSXMLNode* childAtIndex(uint32_t index) const;  // linear in the index; null past the end
+  NSXMLDocument* rootDocument() const;            // the topmost node if it is a document
+  NSXMLNode* rootNode() const;                    // the topmost node
+  int64_t level() const;                          // number of ancestors
   // Position among the children (linear); of an attribute or namespace node negative, namespaces
   // and then attributes preceding the children; 0 without a parent.
   int64_t index() const;
 
   // --- names and values -------------------------------------------------------------------------
   bool hasName() const { return nodeName() != nullptr; }
-  const NSXMLName* nodeName() const;                // null for unnamed kinds
-  const NSXMLExpandedName* expandedName() const;    // elements and attributes only, else null
+  const NSXMLName* nodeName() const;  // null for unnamed kinds
+  // Elements and attributes only, else null.
+  const NSXMLExpandedName* expandedName() const {
+    return kind() == Kind::Element || kind() == Kind::Attribute ? _name->expanded : nullptr;
+  }
   // As strings; null when there is none. A namespace node's name is its prefix ("" for the default
   // namespace), a processing instruction's its target.
   Ref<NSString> name() const;
@@ -110,13 +155,18 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
   // Document order within one tree: -1, 0, 1. Both nodes must have the same root.
   static int compareOrder(const NSXMLNode* a, const NSXMLNode* b);
   // Whether both nodes hang under one root and that root's order numbers can be compared directly.
-  static bool haveComparableOrder(const NSXMLNode* a, const NSXMLNode* b);
+  static bool haveComparableOrder(const NSXMLNode* a, const NSXMLNode* b) {
+    const NSXMLTreeHead* tree = a->block()->tree;
+    if (tree != b->block()->tree) return false;
+    if (__atomic_load_n(&tree->order, __ATOMIC_ACQUIRE) == NSXMLTreeHead::Fresh) return true;
+    return makeOrderComparable(a, b);
+  }
   // The order number; meaningful between nodes for which haveComparableOrder answered true.
   uint32_t orderNumber() const { return _word; }
 
   // --- changes ----------------------------------------------------------------------------------
-  void setStringValue(NSStringView text);   // own text; for an element replaces the children
-  void detach();                            // becomes a root of its own
+  void setStringValue(NSStringView text);     // own text; for an element replaces the children
+  void detach();                              // becomes a root of its own
   [[nodiscard]] Ref<NSXMLNode> copy() const;  // deep copy in a new tree, without parent
 
   // --- output -----------------------------------------------------------------------------------
@@ -141,12 +191,41 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
   NSXMLTree* tree() const;  // the arena that holds the node now
 
  protected:
+  // Bits of `_flags`.
+  enum Flag : uint8_t {
+    WideText = 1,  // the node's own text is UTF-16
+    CDATA = 2,     // a text written as a CDATA section
+  };
+
   explicit NSXMLNode(Kind kind) : NSObject(kind) {}
 
-  NSXMLTree* _tree = nullptr;
+  bool isBranch() const { return kind() <= Kind::Element; }
+  bool isProperty() const { return kind() == Kind::Attribute || kind() == Kind::Namespace; }
+  uint32_t textLength() const {
+    return isProperty() ? _propertyTextLength : isBranch() ? 0 : _textLength;
+  }
+  const NSXMLBlock* block() const {
+    return reinterpret_cast<const NSXMLBlock*>(reinterpret_cast<const char*>(this) -
+                                               size_t{_aux} * 8);
+  }
+  static bool makeOrderComparable(const NSXMLNode* a, const NSXMLNode* b);
+
   NSXMLNode* _parent = nullptr;
   NSXMLNode* _next = nullptr;
+  union {
+    NSXMLNode* _firstChild = nullptr;
+    const void* _text;
+  };
+  union {
+    NSXMLNode* _previous = nullptr;
+    uint32_t _propertyTextLength;
+  };
+  union {
+    const NSXMLName* _name = nullptr;
+    uint32_t _textLength;
+  };
   friend class NSXMLTree;
+  friend class NSXMLElement;
 };
 
 // Names are qualified names as written; the URI is the namespace ("" for none).
@@ -155,10 +234,16 @@ class XQUERY_EXPORT NSXMLElement : public NSXMLNode {
   static bool classof(const NSObject& object) { return object.kind() == Kind::Element; }
   [[nodiscard]] static Ref<NSXMLElement> elementWithName(NSStringView name, NSStringView URI = {});
 
-  NSXMLNode* firstAttribute() const;               // then nextAttribute
-  static NSXMLNode* nextAttribute(const NSXMLNode* attribute);
-  NSXMLNode* firstNamespace() const;               // declared on this element; then nextNamespace
-  static NSXMLNode* nextNamespace(const NSXMLNode* node);
+  NSXMLNode* firstAttribute() const {  // then nextAttribute
+    NSXMLNode* property = _firstProperty;
+    while (property && property->kind() == Kind::Namespace) property = property->_next;
+    return property;
+  }
+  static NSXMLNode* nextAttribute(const NSXMLNode* attribute) { return attribute->_next; }
+  NSXMLNode* firstNamespace() const {  // declared on this element; then nextNamespace
+    return namespaceOrNull(_firstProperty);
+  }
+  static NSXMLNode* nextNamespace(const NSXMLNode* node) { return namespaceOrNull(node->_next); }
   uint32_t attributeCount() const;
   // By qualified name as written / by expanded name; null when missing.
   NSXMLNode* attributeForName(NSStringView name) const;
@@ -176,13 +261,11 @@ class XQUERY_EXPORT NSXMLElement : public NSXMLNode {
 
  private:
   NSXMLElement() : NSXMLNode(Kind::Element) {}
-  NSXMLNode* _previous = nullptr;
-  NSXMLNode* _firstChild = nullptr;
-  NSXMLNode* _lastChild = nullptr;
-  const NSXMLName* _name = nullptr;
-  NSXMLNode* _firstAttribute = nullptr;
-  NSXMLNode* _firstNamespace = nullptr;
-  friend class NSXMLNode;
+  static NSXMLNode* namespaceOrNull(NSXMLNode* property) {
+    return property && property->kind() == Kind::Namespace ? property : nullptr;
+  }
+
+  NSXMLNode* _firstProperty = nullptr;
   friend class NSXMLTree;
 };
 
@@ -210,12 +293,12 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
 
  private:
   NSXMLDocument() : NSXMLNode(Kind::Document) {}
-  NSXMLNode* _firstChild = nullptr;
-  NSXMLNode* _lastChild = nullptr;
+
   NSString* _URI = nullptr;  // owned by the tree
-  friend class NSXMLNode;
   friend class NSXMLTree;
 };
+
+static_assert(sizeof(NSXMLNode) == 48 && sizeof(NSXMLElement) == 56 && sizeof(NSXMLDocument) == 56);
 
 // Interned names. The returned pointer stays valid while a handle to it lives.
 class XQUERY_EXPORT NSXMLExpandedNameRef {

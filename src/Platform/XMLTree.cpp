@@ -1,0 +1,519 @@
+#include "Platform/XMLTree.h"
+
+#include <algorithm>
+#include <cstdlib>
+#include <limits>
+#include <mutex>
+#include <new>
+
+#include "Platform/XMLNames.h"
+
+namespace xquery {
+
+namespace {
+
+// Small blocks come from the object allocator's lists, in multiples of this size; the size is noted
+// in the low bits of the block's link. Size class 0 is a block of malloc's.
+constexpr size_t blockGranule = 16;
+constexpr size_t largestSmallBlock = 128;
+constexpr uintptr_t sizeClassBits = blockGranule - 1;
+
+// Distances within a block are 16-bit counts of 8 bytes.
+constexpr size_t distanceUnit = 8;
+constexpr size_t largestNodeBlock = size_t{1} << 19;
+constexpr size_t largestTextBlock = size_t{1} << 20;
+static_assert((largestNodeBlock - 1) / distanceUnit <= std::numeric_limits<uint16_t>::max());
+
+constexpr size_t largestNode = 56;
+static_assert(sizeof(NSXMLProcessingInstruction) <= largestNode);
+
+NSXMLBlock* nextBlock(const NSXMLBlock* block) {
+  return reinterpret_cast<NSXMLBlock*>(block->next & ~sizeClassBits);
+}
+
+void setNextBlock(NSXMLBlock* block, const NSXMLBlock* next) {
+  block->next = reinterpret_cast<uintptr_t>(next) | (block->next & sizeClassBits);
+}
+
+constexpr size_t roundedUp(size_t value, size_t unit) { return (value + unit - 1) / unit * unit; }
+
+size_t bytesOf(NSStringView text) {
+  return size_t{text.length()} * (text.isWide() ? sizeof(char16_t) : 1);
+}
+
+bool isNarrow(NSStringView text) {
+  if (!text.isWide()) return true;
+  const char16_t* units = text.wideUnits();
+  return std::all_of(units, units + text.length(), [](char16_t unit) { return unit < 0x80; });
+}
+
+// The text copied to `memory`, which has room for it.
+NSStringView copyText(void* memory, NSStringView text, bool narrow) {
+  if (!narrow) {
+    std::memcpy(memory, text.wideUnits(), bytesOf(text));
+    return {static_cast<const char16_t*>(memory), text.length()};
+  }
+  auto* units = static_cast<char*>(memory);
+  if (text.isWide()) {
+    std::copy_n(text.wideUnits(), text.length(), units);
+  } else if (!text.isEmpty()) {
+    std::memcpy(units, text.asciiUnits(), text.length());
+  }
+  return {units, text.length()};
+}
+
+// Renumbering is rare and short, so that trees share a few locks.
+std::mutex& orderLock(const NSXMLTree* tree) {
+  static std::mutex locks[16];
+  return locks[reinterpret_cast<uintptr_t>(tree) / 64 % std::size(locks)];
+}
+
+}  // namespace
+
+// --- the extra part --------------------------------------------------------------------------
+
+struct NSXMLTreeExtra {
+  // Where the next node and text of a tree that grows in bulk go.
+  bool isBulk = false;
+  char* nodeBlock = nullptr;
+  char* nodeCursor = nullptr;
+  char* nodeEnd = nullptr;
+  char* textCursor = nullptr;
+  char* textEnd = nullptr;
+  size_t nextNodeBlock = 0;
+  size_t nextTextBlock = 0;
+
+  std::unordered_set<const NSXMLName*> names;  // one count each
+  std::vector<NSXMLDocument*> documents;       // those with a URI
+};
+
+NSXMLTreeExtra* NSXMLTree::extra() const {
+  return (_extra & 1) ? nullptr : reinterpret_cast<NSXMLTreeExtra*>(_extra);
+}
+
+NSXMLTreeExtra& NSXMLTree::makeExtra() {
+  if (NSXMLTreeExtra* present = extra()) return *present;
+  auto made = std::make_unique<NSXMLTreeExtra>();
+  if (_extra) made->names.insert(reinterpret_cast<const NSXMLName*>(_extra & ~uintptr_t{1}));
+  _extra = reinterpret_cast<uintptr_t>(made.get());
+  return *made.release();
+}
+
+template <class Function>
+void NSXMLTree::forEachName(Function function) const {
+  if (_extra & 1) {
+    function(reinterpret_cast<const NSXMLName*>(_extra & ~uintptr_t{1}));
+  } else if (const NSXMLTreeExtra* present = extra()) {
+    for (const NSXMLName* name : present->names) function(name);
+  }
+}
+
+void NSXMLTree::adopt(const NSXMLName* name) {
+  const uintptr_t single = reinterpret_cast<uintptr_t>(name) | 1;
+  if (_extra == 0) {
+    _extra = single;
+  } else if (_extra == single || !makeExtra().names.insert(name).second) {
+    NSXMLReleaseName(name);
+  }
+}
+
+// --- life ------------------------------------------------------------------------------------
+
+NSXMLTree* NSXMLTree::create() { return ::new (NSCounted::operator new(sizeof(NSXMLTree))) NSXMLTree; }
+
+void NSXMLTree::destroy() {
+  if (NSXMLTreeExtra* present = extra()) {
+    for (NSXMLDocument* document : present->documents) document->_URI->release();
+  }
+  forEachName([](const NSXMLName* name) { NSXMLReleaseName(name); });
+  freeBlocks();
+  const std::unique_ptr<NSXMLTreeExtra> owned(extra());
+  NSCounted::operator delete(this, sizeof(NSXMLTree));
+}
+
+void NSXMLTree::freeBlocks() {
+  if (!_lastBlock) return;
+  NSXMLBlock* block = nextBlock(_lastBlock);
+  setNextBlock(_lastBlock, nullptr);
+  while (block) {
+    NSXMLBlock* next = nextBlock(block);
+    if (const size_t sizeClass = block->next & sizeClassBits) {
+      NSCounted::operator delete(block, sizeClass * blockGranule);
+    } else {
+      std::free(block);
+    }
+    block = next;
+  }
+}
+
+// A count that has ever reached the top bit stays there: such a tree is never freed.
+namespace {
+constexpr uint32_t immortalBit = 0x80000000U;
+}
+
+void NSXMLTree::retain() {
+  const uint32_t count = __atomic_load_n(&references, __ATOMIC_RELAXED);
+  if (count & immortalBit) return;
+  if (__libc_single_threaded) {
+    references = count + 1;
+  } else {
+    __atomic_fetch_add(&references, 1U, __ATOMIC_RELAXED);
+  }
+}
+
+void NSXMLTree::release() {
+  const uint32_t count = __atomic_load_n(&references, __ATOMIC_RELAXED);
+  if (count & immortalBit) return;
+  if (__libc_single_threaded) {
+    if ((references = count - 1) == 0) destroy();
+  } else if (__atomic_fetch_sub(&references, 1U, __ATOMIC_ACQ_REL) == 1) {
+    destroy();
+  }
+}
+
+void retainTreeOf(const NSXMLNode* node) { NSXMLTree::of(node)->retain(); }
+void releaseTreeOf(const NSXMLNode* node) { NSXMLTree::of(node)->release(); }
+
+// --- blocks ----------------------------------------------------------------------------------
+
+void NSXMLTree::setBlockCount(uint64_t count) {
+  const uint64_t most = 0xFFFFFF;
+  const uint64_t kept = std::min(count, most);
+  blockCountHigh = static_cast<uint8_t>(kept >> 16);
+  blockCountLow = static_cast<uint16_t>(kept);
+}
+
+// A new block at the end of the ring, with room for that many bytes after its head.
+NSXMLBlock* NSXMLTree::allocateBlock(size_t bytes) {
+  const size_t size = roundedUp(sizeof(NSXMLBlock) + bytes, blockGranule);
+  const bool isSmall = size <= largestSmallBlock;
+  void* memory = isSmall ? NSCounted::operator new(size) : std::malloc(size);
+  if (!memory) throw std::bad_alloc();
+  auto* block = ::new (memory) NSXMLBlock{this, isSmall ? size / blockGranule : 0};
+  if (_lastBlock) {
+    setNextBlock(block, nextBlock(_lastBlock));
+    setNextBlock(_lastBlock, block);
+  } else {
+    setNextBlock(block, block);
+  }
+  _lastBlock = block;
+  setBlockCount(uint64_t{blockCount()} + 1);
+  return block;
+}
+
+void NSXMLTree::startBulk(size_t nodeBytes, size_t textBytes) {
+  NSXMLTreeExtra& state = makeExtra();
+  state.isBulk = true;
+  state.nextNodeBlock = std::min(roundedUp(nodeBytes, blockGranule), largestNodeBlock / 2);
+  state.nextTextBlock = std::min(textBytes, largestTextBlock / 2);
+}
+
+void NSXMLTree::endBulk() {
+  if (NSXMLTreeExtra* state = extra()) state->isBulk = false;
+}
+
+void* NSXMLTree::allocateBulkNode(size_t bytes, uint16_t& distance) {
+  NSXMLTreeExtra& state = *extra();
+  if (static_cast<size_t>(state.nodeEnd - state.nodeCursor) < bytes) {
+    const size_t room = std::max(state.nextNodeBlock, bytes);
+    state.nodeBlock = reinterpret_cast<char*>(allocateBlock(room));
+    state.nodeCursor = state.nodeBlock + sizeof(NSXMLBlock);
+    state.nodeEnd = state.nodeCursor + room;
+    state.nextNodeBlock = std::min(room * 2, largestNodeBlock - sizeof(NSXMLBlock));
+  }
+  char* node = state.nodeCursor;
+  state.nodeCursor += bytes;
+  distance = static_cast<uint16_t>(static_cast<size_t>(node - state.nodeBlock) / distanceUnit);
+  return node;
+}
+
+void* NSXMLTree::allocateNode(size_t bytes, size_t textBytes, uint16_t& distance) {
+  if (const NSXMLTreeExtra* state = extra(); state && state->isBulk) {
+    return allocateBulkNode(bytes, distance);
+  }
+  distance = sizeof(NSXMLBlock) / distanceUnit;
+  return allocateBlock(bytes + textBytes) + 1;
+}
+
+void* NSXMLTree::allocateText(size_t bytes) {
+  NSXMLTreeExtra* state = extra();
+  if (!state || !state->isBulk) return allocateBlock(bytes) + 1;
+  // Keep texts at even addresses, for those in UTF-16.
+  const size_t rounded = roundedUp(bytes, alignof(char16_t));
+  if (static_cast<size_t>(state->textEnd - state->textCursor) < rounded) {
+    // A text that would waste much of a block has one of its own.
+    if (rounded > state->nextTextBlock / 4) return allocateBlock(rounded) + 1;
+    const size_t room = state->nextTextBlock;
+    state->textCursor = reinterpret_cast<char*>(allocateBlock(room) + 1);
+    state->textEnd = state->textCursor + room;
+    state->nextTextBlock = std::min(room * 2, largestTextBlock);
+  }
+  char* text = state->textCursor;
+  state->textCursor += rounded;
+  return text;
+}
+
+// --- nodes -----------------------------------------------------------------------------------
+
+template <class Node, class... Arguments>
+Node* NSXMLTree::makeNodeOf(size_t textBytes, Arguments... arguments) {
+  uint16_t distance = 0;
+  void* memory = allocateNode(sizeof(Node), textBytes, distance);
+  Node* node = ::new (memory) Node(arguments...);
+  node->_aux = distance;
+  return node;
+}
+
+NSXMLElement* NSXMLTree::makeElement() { return makeNodeOf<NSXMLElement>(0); }
+NSXMLDocument* NSXMLTree::makeDocument() { return makeNodeOf<NSXMLDocument>(0); }
+
+NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text) {
+  const bool narrow = isNarrow(text);
+  const size_t textBytes = narrow ? text.length() : bytesOf(text);
+  const NSXMLTreeExtra* state = extra();
+  const bool isBulk = state && state->isBulk;
+  const bool isPI = kind == Kind::ProcessingInstruction;
+  NSXMLNode* node = isPI ? makeNodeOf<NSXMLProcessingInstruction>(textBytes)
+                         : makeNodeOf<NSXMLNode>(textBytes, kind);
+  const size_t nodeBytes = isPI ? sizeof(NSXMLProcessingInstruction) : sizeof(NSXMLNode);
+  void* memory = isBulk ? allocateText(textBytes) : reinterpret_cast<char*>(node) + nodeBytes;
+  setStoredText(node, copyText(memory, text, narrow));
+  return node;
+}
+
+void NSXMLTree::setStoredText(NSXMLNode* node, NSStringView text) {
+  node->_text = text.isWide() ? static_cast<const void*>(text.wideUnits()) : text.asciiUnits();
+  (node->isProperty() ? node->_propertyTextLength : node->_textLength) = text.length();
+  node->_flags = static_cast<uint8_t>(text.isWide() ? node->_flags | NSXMLNode::WideText
+                                                    : node->_flags & ~NSXMLNode::WideText);
+}
+
+void NSXMLTree::setText(NSXMLNode* node, NSStringView text) {
+  const bool narrow = isNarrow(text);
+  const size_t textBytes = narrow ? text.length() : bytesOf(text);
+  setStoredText(node, copyText(allocateText(textBytes), text, narrow));
+}
+
+void NSXMLTree::setAdoptedName(NSXMLNode* node, const NSXMLName* name) {
+  if (auto* instruction = dyn_cast<NSXMLProcessingInstruction>(node)) {
+    instruction->_target = name;
+  } else {
+    node->_name = name;
+  }
+}
+
+void NSXMLTree::setURI(NSXMLDocument* document, const NSString* URI) {
+  // A copy: a string that references text of this very tree would keep it alive for ever.
+  NSString* text = URI ? NSString::stringWithView(URI->view()).detach() : nullptr;
+  auto& documents = makeExtra().documents;
+  if (document->_URI) {
+    document->_URI->release();
+    std::erase(documents, document);
+  }
+  document->_URI = text;
+  if (text) documents.push_back(document);
+}
+
+NSXMLNode* NSXMLTree::makeLoneNode(Kind kind, NSStringView text) {
+  return create()->makeNode(kind, text);
+}
+
+NSXMLNode* NSXMLTree::makeLoneNode(Kind kind, NSStringView text, NSStringView name,
+                                   NSStringView URI) {
+  NSXMLTree* tree = create();
+  NSXMLNode* node = tree->makeNode(kind, text);
+  tree->setName(node, NSXMLInternName(name, URI));
+  return node;
+}
+
+NSXMLElement* NSXMLTree::makeLoneElement(NSStringView name, NSStringView URI) {
+  NSXMLTree* tree = create();
+  NSXMLElement* element = tree->makeElement();
+  tree->setName(element, NSXMLInternName(name, URI));
+  return element;
+}
+
+// --- merging ---------------------------------------------------------------------------------
+
+void NSXMLTree::merge(NSXMLTree* a, NSXMLTree* b) {
+  if (a == b) return;
+  if (a->blockCount() < b->blockCount()) std::swap(a, b);
+  a->absorb(b);
+}
+
+void NSXMLTree::absorb(NSXMLTree* smaller) {
+  absorbExtra(smaller);
+  NSXMLBlock* block = smaller->_lastBlock;
+  do {
+    block->tree = this;
+    block = nextBlock(block);
+  } while (block != smaller->_lastBlock);
+  NSXMLBlock* first = nextBlock(_lastBlock);
+  setNextBlock(_lastBlock, nextBlock(smaller->_lastBlock));
+  setNextBlock(smaller->_lastBlock, first);
+  setBlockCount(uint64_t{blockCount()} + smaller->blockCount());
+  const uint64_t sum = uint64_t{references} + smaller->references;
+  references = sum >= immortalBit ? immortalBit : static_cast<uint32_t>(sum);
+  NSCounted::operator delete(smaller, sizeof(NSXMLTree));
+}
+
+void NSXMLTree::absorbExtra(NSXMLTree* smaller) {
+  // The larger set of names takes in the smaller one.
+  const NSXMLTreeExtra* theirs = smaller->extra();
+  const NSXMLTreeExtra* ours = extra();
+  if (theirs && (!ours || theirs->names.size() > ours->names.size())) {
+    std::swap(_extra, smaller->_extra);
+  }
+  smaller->forEachName([this](const NSXMLName* name) { adopt(name); });
+  if (NSXMLTreeExtra* rest = smaller->extra()) {
+    auto& documents = makeExtra().documents;
+    documents.insert(documents.end(), rest->documents.begin(), rest->documents.end());
+    const std::unique_ptr<NSXMLTreeExtra> owned(rest);
+  }
+  smaller->_extra = 0;
+}
+
+// --- structure -------------------------------------------------------------------------------
+
+void NSXMLTree::noteChange(const NSXMLNode* parent) {
+  NSXMLTree* tree = of(parent);
+  if (tree->order == Fresh) {
+    tree->order = Stale;
+  } else if (tree->order == SeveralRoots) {
+    parent->rootNode()->_word = staleRoot;
+  }
+}
+
+namespace {
+
+// Both trees are to become one: if either had several roots, so has the sum.
+void prepareToJoin(NSXMLTree* parents, NSXMLTree* childs) {
+  if (parents == childs) return;
+  const bool several = parents->order == NSXMLTreeHead::SeveralRoots ||
+                       childs->order == NSXMLTreeHead::SeveralRoots;
+  parents->order = childs->order = several ? NSXMLTreeHead::SeveralRoots : NSXMLTreeHead::Stale;
+}
+
+}  // namespace
+
+bool NSXMLTree::adoptChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before) {
+  if (!child || child->_parent || child->isProperty() || child->kind() == Kind::Document) {
+    return false;
+  }
+  if (of(parent) == of(child) && parent->rootNode() == child) return false;
+  insertChild(parent, child, before);
+  return true;
+}
+
+void NSXMLTree::insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before) {
+  prepareToJoin(of(parent), of(child));
+  merge(of(parent), of(child));
+  noteChange(parent);
+  child->_parent = parent;
+  child->_next = before;
+  NSXMLNode* first = parent->_firstChild;
+  if (!first) {
+    child->_previous = child;
+    parent->_firstChild = child;
+    return;
+  }
+  NSXMLNode* successor = before ? before : first;  // whose previous field names the predecessor
+  child->_previous = successor->_previous;
+  if (before == first) {
+    parent->_firstChild = child;
+  } else {
+    successor->_previous->_next = child;
+  }
+  successor->_previous = child;
+}
+
+void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property) {
+  prepareToJoin(of(element), of(property));
+  merge(of(element), of(property));
+  noteChange(element);
+  // Namespaces before attributes, each in the order of their arrival.
+  const bool isNamespace = property->kind() == Kind::Namespace;
+  NSXMLNode** link = &element->_firstProperty;
+  while (*link && !(isNamespace && (*link)->kind() == Kind::Attribute)) link = &(*link)->_next;
+  property->_parent = element;
+  property->_next = *link;
+  *link = property;
+}
+
+void NSXMLTree::unlink(NSXMLNode* node) {
+  NSXMLNode* parent = node->_parent;
+  if (node->isProperty()) {
+    NSXMLNode** link = &cast<NSXMLElement>(parent)->_firstProperty;
+    while (*link != node) link = &(*link)->_next;
+    *link = node->_next;
+  } else {
+    NSXMLNode* first = parent->_firstChild;
+    NSXMLNode* successor = node->_next ? node->_next : first;
+    successor->_previous = node->_previous;
+    if (node == first) {
+      parent->_firstChild = node->_next;
+    } else {
+      node->_previous->_next = node->_next;
+    }
+    node->_previous = nullptr;
+  }
+  node->_parent = nullptr;
+  node->_next = nullptr;
+}
+
+void NSXMLTree::detach(NSXMLNode* node) {
+  NSXMLTree* tree = of(node);
+  NSXMLNode* root = node->rootNode();
+  unlink(node);
+  // Taking a part out leaves the order of what remains, and of the part, as it was.
+  const bool fresh =
+      tree->order == Fresh || (tree->order == SeveralRoots && root->_word != staleRoot);
+  tree->order = SeveralRoots;
+  if (!fresh) root->_word = node->_word = staleRoot;
+}
+
+// --- order -----------------------------------------------------------------------------------
+
+void NSXMLTree::renumber(const NSXMLNode* root) {
+  uint32_t number = firstOrderNumber;
+  for (const NSXMLNode* node = root; node; node = node->nextNode()) {
+    if (node != root) node->_word = number;
+    ++number;
+    const auto* element = dyn_cast<NSXMLElement>(node);
+    if (!element) continue;
+    for (const NSXMLNode* property = element->_firstProperty; property;
+         property = property->_next) {
+      property->_word = number++;
+    }
+  }
+  // The root's comes last: in a tree of several roots it publishes the others.
+  __atomic_store_n(&root->_word, firstOrderNumber, __ATOMIC_RELEASE);
+}
+
+void NSXMLTree::makeOrderFresh(const NSXMLNode* root) {
+  const std::lock_guard<std::mutex> guard(orderLock(this));
+  if (order == SeveralRoots) {
+    if (root->_word == staleRoot) renumber(root);
+  } else if (order == Stale) {
+    renumber(root);
+    __atomic_store_n(&order, Fresh, __ATOMIC_RELEASE);
+  }
+}
+
+bool NSXMLNode::makeOrderComparable(const NSXMLNode* a, const NSXMLNode* b) {
+  NSXMLTree* tree = NSXMLTree::of(a);
+  const NSXMLNode* root = a->rootNode();
+  if (__atomic_load_n(&tree->order, __ATOMIC_ACQUIRE) == NSXMLTreeHead::SeveralRoots) {
+    if (root != b->rootNode()) return false;
+    if (__atomic_load_n(&root->_word, __ATOMIC_ACQUIRE) != NSXMLTree::staleRoot) return true;
+  }
+  tree->makeOrderFresh(root);
+  return true;
+}
+
+int NSXMLNode::compareOrder(const NSXMLNode* a, const NSXMLNode* b) {
+  if (a == b || !haveComparableOrder(a, b)) return 0;
+  return a->_word < b->_word ? -1 : 1;
+}
+
+}  // namespace xquery

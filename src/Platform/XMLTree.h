@@ -1,0 +1,155 @@
+// The arena of a tree.
+//
+//   NSXMLTree (24 bytes)        block of one node           bulk node block       text block
+//     count, order, blocks        head: tree, next            head, end             head
+//     last block ---------------> node                        node node node ...    text text ...
+//     names, cursors              [its text]
+//
+// The blocks of a tree form a ring (the tree knows the last, whose next is the first). The head of
+// a block names the tree; a node knows how far it is from the head of its block. So merging two
+// trees means renaming the tree in the heads of the one with fewer blocks and joining the rings:
+// constant time for the usual case of a small tree, a logarithm of renamings per block at worst,
+// and neither nodes nor readers are involved.
+//
+// Nodes made singly come in blocks just large enough, together with their text, since a query may
+// construct very many small elements. Trees that are parsed or copied grow by large blocks; the
+// state for that, and whatever else a small tree does not need, is in the extra part.
+#pragma once
+
+#include <cstddef>
+#include <memory>
+#include <unordered_set>
+#include <vector>
+
+#include "xquery/XMLNode.h"
+
+namespace xquery {
+
+// A processing instruction has a name beside its text.
+class NSXMLProcessingInstruction : public NSXMLNode {
+ public:
+  static bool classof(const NSObject& object) {
+    return object.kind() == Kind::ProcessingInstruction;
+  }
+
+ private:
+  NSXMLProcessingInstruction() : NSXMLNode(Kind::ProcessingInstruction) {}
+  const NSXMLName* _target = nullptr;
+  friend class NSXMLTree;
+};
+
+struct NSXMLTreeExtra;
+
+class NSXMLTree : public NSXMLTreeHead {
+ public:
+  static NSXMLTree* of(const NSXMLNode* node) {
+    return static_cast<NSXMLTree*>(node->block()->tree);
+  }
+  // A tree without nodes or references. Whoever creates it makes a reference to a node of it, or
+  // destroys it.
+  [[nodiscard]] static NSXMLTree* create();
+  void destroy();
+
+  void retain();
+  void release();
+
+  // --- nodes: without parent, order number 0 ---------------------------------------------------
+  // From now on nodes and texts come from large blocks, the first with room for that many bytes.
+  void startBulk(size_t nodeBytes, size_t textBytes);
+  // Gives the rest of the newest blocks back.
+  void endBulk();
+  NSXMLNode* makeNode(Kind kind, NSStringView text);  // all but elements and documents
+  NSXMLElement* makeElement();
+  NSXMLDocument* makeDocument();
+  // A node in a new tree that holds nothing else.
+  [[nodiscard]] static NSXMLNode* makeLoneNode(Kind kind, NSStringView text);
+  [[nodiscard]] static NSXMLNode* makeLoneNode(Kind kind, NSStringView text, NSStringView name,
+                                               NSStringView URI = {});
+  [[nodiscard]] static NSXMLElement* makeLoneElement(NSStringView name, NSStringView URI);
+
+  // --- names and texts -------------------------------------------------------------------------
+  // The tree takes over one count of the name.
+  void setName(NSXMLNode* node, const NSXMLName* name) {
+    adopt(name);
+    setAdoptedName(node, name);
+  }
+  // For a name that the tree holds already.
+  static void setAdoptedName(NSXMLNode* node, const NSXMLName* name);
+  static const NSXMLName* targetOf(const NSXMLNode* instruction) {
+    return cast<NSXMLProcessingInstruction>(instruction)->_target;
+  }
+  // The tree takes over the caller's count of the name.
+  void adopt(const NSXMLName* name);
+  // Copies the text into the arena, in 8-bit form if it fits it.
+  void setText(NSXMLNode* node, NSStringView text);
+  // Room for that many bytes of text, aligned for UTF-16.
+  void* allocateText(size_t bytes);
+  // For a text that is in the arena.
+  static void setStoredText(NSXMLNode* node, NSStringView text);
+  void setURI(NSXMLDocument* document, const NSString* URI);  // null for none
+
+  // --- structure -------------------------------------------------------------------------------
+  // Links what may become a child of `parent`: a parentless node that is neither a document nor an
+  // attribute nor a namespace nor the root above `parent`. Answer: whether it did.
+  static bool adoptChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before);
+  // The rest leaves checks to the caller.
+  // Links a parentless node, moving its tree into this one. `before` is null to append.
+  static void insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before);
+  static void appendProperty(NSXMLElement* element, NSXMLNode* property);
+  static void detach(NSXMLNode* node);
+  // For builders: the fields of a node, as they are.
+  static NSXMLNode*& parentOf(NSXMLNode* node) { return node->_parent; }
+  static NSXMLNode*& nextOf(NSXMLNode* node) { return node->_next; }
+  static NSXMLNode*& previousOf(NSXMLNode* node) { return node->_previous; }
+  static NSXMLNode*& firstChildOf(NSXMLNode* node) { return node->_firstChild; }
+  static NSXMLNode*& firstPropertyOf(NSXMLElement* element) { return element->_firstProperty; }
+  static NSXMLNode* firstPropertyOf(const NSXMLElement* element) {
+    return element->_firstProperty;
+  }
+  static NSXMLNode* nextProperty(const NSXMLNode* property) { return property->_next; }
+  static void setOrderNumber(NSXMLNode* node, uint32_t number) { node->_word = number; }
+  static void setCDATA(NSXMLNode* node) { node->_flags |= NSXMLNode::CDATA; }
+  static bool isCDATA(const NSXMLNode* node) { return (node->_flags & NSXMLNode::CDATA) != 0; }
+
+  // The number of a root whose subtree's numbers are good, as they are assigned; and of a root whose
+  // subtree's numbers are not good, where the tree has several roots.
+  static constexpr uint32_t firstOrderNumber = 1;
+  static constexpr uint32_t staleRoot = 0;
+  // Makes the numbers under this root good, by one thread at a time.
+  void makeOrderFresh(const NSXMLNode* root);
+
+ private:
+  NSXMLTree() = default;
+
+  uint32_t blockCount() const { return blockCountHigh << 16 | blockCountLow; }
+  void setBlockCount(uint64_t count);
+  NSXMLBlock* allocateBlock(size_t bytes);
+  void freeBlocks();
+  void* allocateNode(size_t bytes, size_t textBytes, uint16_t& distance);
+  void* allocateBulkNode(size_t bytes, uint16_t& distance);
+  template <class Node, class... Arguments>
+  Node* makeNodeOf(size_t textBytes, Arguments... arguments);
+
+  NSXMLTreeExtra* extra() const;
+  NSXMLTreeExtra& makeExtra();
+  template <class Function>
+  void forEachName(Function function) const;
+
+  static void merge(NSXMLTree* a, NSXMLTree* b);
+  void absorb(NSXMLTree* smaller);
+  void absorbExtra(NSXMLTree* smaller);
+  // Before the structure under `parent` changes.
+  static void noteChange(const NSXMLNode* parent);
+  static void unlink(NSXMLNode* node);
+  static void renumber(const NSXMLNode* root);
+
+  uint8_t blockCountHigh = 0;  // saturates; only compared
+  uint16_t blockCountLow = 0;
+  NSXMLBlock* _lastBlock = nullptr;
+  // 0, or the only name of the tree with the low bit set, or an NSXMLTreeExtra.
+  uintptr_t _extra = 0;
+};
+
+static_assert(sizeof(NSXMLTree) == 24);
+
+}  // namespace xquery
