@@ -3,7 +3,9 @@
 
 namespace xquery {
 
-Ref<NSXMLDocument> NSXMLDocument::document() { return NSXMLTree::create()->makeDocument(); }
+Ref<NSXMLDocument> NSXMLDocument::document() {
+  return NSXMLTree::create()->makeDocument();
+}
 
 NSXMLElement* NSXMLDocument::rootElement() const {
   NSXMLNode* child = firstChild();
@@ -11,7 +13,9 @@ NSXMLElement* NSXMLDocument::rootElement() const {
   return cast<NSXMLElement>(child);
 }
 
-Ref<NSString> NSXMLDocument::documentURI() const { return _URI; }
+Ref<NSString> NSXMLDocument::documentURI() const {
+  return _URI;
+}
 
 void NSXMLDocument::setURI(const Ref<NSString>& URI) {
   NSXMLTree::of(this)->setURI(this, URI.get());

@@ -24,8 +24,8 @@ NSXMLNode* NSXMLElement::attributeForName(NSStringView name) const {
 
 NSXMLNode* NSXMLElement::attributeForLocalName(NSStringView localName, NSStringView URI) const {
   NSXMLNode* attribute = firstAttribute();
-  while (attribute && !(attribute->localNameView().equals(localName) &&
-                        attribute->URIView().equals(URI))) {
+  while (attribute &&
+         !(attribute->localNameView().equals(localName) && attribute->URIView().equals(URI))) {
     attribute = nextAttribute(attribute);
   }
   return attribute;

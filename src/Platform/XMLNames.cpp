@@ -6,12 +6,11 @@
 // it. Hashes start from a random seed: whoever writes a document cannot choose names that collide.
 #include "Platform/XMLNames.h"
 
-#include <sys/random.h>
-
 #include <array>
 #include <cstdlib>
 #include <mutex>
 #include <new>
+#include <sys/random.h>
 #include <unordered_set>
 
 namespace xquery {
@@ -42,8 +41,8 @@ uint64_t hashText(NSStringView text, uint64_t start) {
   static const uint64_t seed = randomSeed();
   constexpr uint64_t multiplier = 0x9E3779B97F4A7C15ULL;
   const size_t size = size_t{text.length()} * (text.isWide() ? sizeof(char16_t) : 1);
-  const char* bytes = text.isWide() ? reinterpret_cast<const char*>(text.wideUnits())
-                                    : text.asciiUnits();
+  const char* bytes =
+      text.isWide() ? reinterpret_cast<const char*>(text.wideUnits()) : text.asciiUnits();
   uint64_t hash = mixed(start ^ seed, multiplier ^ size);
   for (size_t at = 0; at < size; at += sizeof(uint64_t)) {
     uint64_t word = 0;
@@ -246,15 +245,16 @@ const NSXMLExpandedName* NSXMLInternExpandedName(NSStringView localName, NSStrin
 const NSXMLName* NSXMLInternName(NSStringView qualifiedName, NSStringView URI) {
   const NarrowText narrowName(qualifiedName);
   const NarrowText narrowURI(URI);
-  return tables().names.intern(NameKey(narrowName.view(), narrowURI.view()), [](const NameKey& key) {
-    auto* entry = allocateEntry<NSXMLName>(key.text, &NSXMLName::text);
-    entry->prefixLength = prefixLengthOf(key.text);
-    // A local name may fit the 8-bit form where its prefix does not.
-    const NSStringView localName =
-        entry->prefixLength ? key.text.substring(entry->prefixLength + 1) : key.text;
-    entry->expanded = internNarrowExpandedName(NarrowText(localName).view(), key.URI);
-    return entry;
-  });
+  return tables().names.intern(
+      NameKey(narrowName.view(), narrowURI.view()), [](const NameKey& key) {
+        auto* entry = allocateEntry<NSXMLName>(key.text, &NSXMLName::text);
+        entry->prefixLength = prefixLengthOf(key.text);
+        // A local name may fit the 8-bit form where its prefix does not.
+        const NSStringView localName =
+            entry->prefixLength ? key.text.substring(entry->prefixLength + 1) : key.text;
+        entry->expanded = internNarrowExpandedName(NarrowText(localName).view(), key.URI);
+        return entry;
+      });
 }
 
 void NSXMLRetainName(const NSXMLExpandedName* name) {

@@ -10,14 +10,18 @@ namespace xquery {
 namespace {
 
 // Navigation answers nodes that the caller may change, whoever asks.
-NSXMLNode* changeable(const NSXMLNode* node) { return const_cast<NSXMLNode*>(node); }
+NSXMLNode* changeable(const NSXMLNode* node) {
+  return const_cast<NSXMLNode*>(node);
+}
 
 Ref<NSString> stringOrNull(const NSXMLNode* owner, NSStringView text) {
   if (text.isEmpty()) return nullptr;
   return NSString::stringInTreeOf(owner, text);
 }
 
-bool isTextOf(const NSXMLNode* node) { return node->kind() == Kind::Text; }
+bool isTextOf(const NSXMLNode* node) {
+  return node->kind() == Kind::Text;
+}
 
 // The first text node from `node` on, within the subtree of `root`.
 const NSXMLNode* textFrom(const NSXMLNode* node, const NSXMLNode* end) {
@@ -37,7 +41,9 @@ const NSXMLNode* endOfSubtree(const NSXMLNode* root) {
 
 // --- navigation ------------------------------------------------------------------------------
 
-NSXMLTree* NSXMLNode::tree() const { return NSXMLTree::of(this); }
+NSXMLTree* NSXMLNode::tree() const {
+  return NSXMLTree::of(this);
+}
 
 uint32_t NSXMLNode::childCount() const {
   uint32_t count = 0;
@@ -57,7 +63,9 @@ NSXMLNode* NSXMLNode::rootNode() const {
   return changeable(node);
 }
 
-NSXMLDocument* NSXMLNode::rootDocument() const { return dyn_cast<NSXMLDocument>(rootNode()); }
+NSXMLDocument* NSXMLNode::rootDocument() const {
+  return dyn_cast<NSXMLDocument>(rootNode());
+}
 
 int64_t NSXMLNode::level() const {
   int64_t count = 0;
@@ -121,8 +129,12 @@ Ref<NSString> NSXMLNode::localName() const {
 }
 
 // The texts of names live as long as the tree, which holds the names.
-Ref<NSString> NSXMLNode::prefix() const { return stringOrNull(this, prefixView()); }
-Ref<NSString> NSXMLNode::URI() const { return stringOrNull(this, URIView()); }
+Ref<NSString> NSXMLNode::prefix() const {
+  return stringOrNull(this, prefixView());
+}
+Ref<NSString> NSXMLNode::URI() const {
+  return stringOrNull(this, URIView());
+}
 
 NSStringView NSXMLNode::textView() const {
   if (isBranch()) return {};

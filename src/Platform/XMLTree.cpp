@@ -1,12 +1,12 @@
 #include "Platform/XMLTree.h"
 
+#include "Platform/XMLNames.h"
+
 #include <algorithm>
 #include <cstdlib>
 #include <limits>
 #include <mutex>
 #include <new>
-
-#include "Platform/XMLNames.h"
 
 namespace xquery {
 
@@ -35,7 +35,9 @@ void setNextBlock(NSXMLBlock* block, const NSXMLBlock* next) {
   block->next = reinterpret_cast<uintptr_t>(next) | (block->next & sizeClassBits);
 }
 
-constexpr size_t roundedUp(size_t value, size_t unit) { return (value + unit - 1) / unit * unit; }
+constexpr size_t roundedUp(size_t value, size_t unit) {
+  return (value + unit - 1) / unit * unit;
+}
 
 size_t bytesOf(NSStringView text) {
   return size_t{text.length()} * (text.isWide() ? sizeof(char16_t) : 1);
@@ -119,7 +121,9 @@ void NSXMLTree::adopt(const NSXMLName* name) {
 
 // --- life ------------------------------------------------------------------------------------
 
-NSXMLTree* NSXMLTree::create() { return ::new (NSCounted::operator new(sizeof(NSXMLTree))) NSXMLTree; }
+NSXMLTree* NSXMLTree::create() {
+  return ::new (NSCounted::operator new(sizeof(NSXMLTree))) NSXMLTree;
+}
 
 void NSXMLTree::destroy() {
   if (NSXMLTreeExtra* present = extra()) {
@@ -138,7 +142,7 @@ void NSXMLTree::freeBlocks() {
   while (block) {
     NSXMLBlock* next = nextBlock(block);
     if (const size_t sizeClass = block->next & sizeClassBits) {
-      NSCounted::operator delete(block, sizeClass * blockGranule);
+      NSCounted::operator delete(block, sizeClass* blockGranule);
     } else {
       std::free(block);
     }
@@ -171,8 +175,12 @@ void NSXMLTree::release() {
   }
 }
 
-void retainTreeOf(const NSXMLNode* node) { NSXMLTree::of(node)->retain(); }
-void releaseTreeOf(const NSXMLNode* node) { NSXMLTree::of(node)->release(); }
+void retainTreeOf(const NSXMLNode* node) {
+  NSXMLTree::of(node)->retain();
+}
+void releaseTreeOf(const NSXMLNode* node) {
+  NSXMLTree::of(node)->release();
+}
 
 // --- blocks ----------------------------------------------------------------------------------
 
@@ -264,8 +272,17 @@ Node* NSXMLTree::makeNodeOf(size_t textBytes, Arguments... arguments) {
   return node;
 }
 
-NSXMLElement* NSXMLTree::makeElement() { return makeNodeOf<NSXMLElement>(0); }
-NSXMLDocument* NSXMLTree::makeDocument() { return makeNodeOf<NSXMLDocument>(0); }
+NSXMLElement* NSXMLTree::makeElement() {
+  return makeNodeOf<NSXMLElement>(0);
+}
+NSXMLDocument* NSXMLTree::makeDocument() {
+  return makeNodeOf<NSXMLDocument>(0);
+}
+
+NSXMLNode* NSXMLTree::makeNode(Kind kind) {
+  return kind == Kind::ProcessingInstruction ? makeNodeOf<NSXMLProcessingInstruction>(0)
+                                             : makeNodeOf<NSXMLNode>(0, kind);
+}
 
 NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text) {
   const bool narrow = isNarrow(text);
@@ -389,8 +406,8 @@ namespace {
 // Both trees are to become one: if either had several roots, so has the sum.
 void prepareToJoin(NSXMLTree* parents, NSXMLTree* childs) {
   if (parents == childs) return;
-  const bool several = parents->order == NSXMLTreeHead::SeveralRoots ||
-                       childs->order == NSXMLTreeHead::SeveralRoots;
+  const bool several =
+      parents->order == NSXMLTreeHead::SeveralRoots || childs->order == NSXMLTreeHead::SeveralRoots;
   parents->order = childs->order = several ? NSXMLTreeHead::SeveralRoots : NSXMLTreeHead::Stale;
 }
 

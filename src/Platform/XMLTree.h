@@ -16,12 +16,12 @@
 // state for that, and whatever else a small tree does not need, is in the extra part.
 #pragma once
 
+#include "xquery/XMLNode.h"
+
 #include <cstddef>
 #include <memory>
 #include <unordered_set>
 #include <vector>
-
-#include "xquery/XMLNode.h"
 
 namespace xquery {
 
@@ -58,7 +58,9 @@ class NSXMLTree : public NSXMLTreeHead {
   void startBulk(size_t nodeBytes, size_t textBytes);
   // Gives the rest of the newest blocks back.
   void endBulk();
-  NSXMLNode* makeNode(Kind kind, NSStringView text);  // all but elements and documents
+  // All kinds but elements and documents.
+  NSXMLNode* makeNode(Kind kind);
+  NSXMLNode* makeNode(Kind kind, NSStringView text);
   NSXMLElement* makeElement();
   NSXMLDocument* makeDocument();
   // A node in a new tree that holds nothing else.
@@ -103,16 +105,14 @@ class NSXMLTree : public NSXMLTreeHead {
   static NSXMLNode*& previousOf(NSXMLNode* node) { return node->_previous; }
   static NSXMLNode*& firstChildOf(NSXMLNode* node) { return node->_firstChild; }
   static NSXMLNode*& firstPropertyOf(NSXMLElement* element) { return element->_firstProperty; }
-  static NSXMLNode* firstPropertyOf(const NSXMLElement* element) {
-    return element->_firstProperty;
-  }
+  static NSXMLNode* firstPropertyOf(const NSXMLElement* element) { return element->_firstProperty; }
   static NSXMLNode* nextProperty(const NSXMLNode* property) { return property->_next; }
   static void setOrderNumber(NSXMLNode* node, uint32_t number) { node->_word = number; }
   static void setCDATA(NSXMLNode* node) { node->_flags |= NSXMLNode::CDATA; }
   static bool isCDATA(const NSXMLNode* node) { return (node->_flags & NSXMLNode::CDATA) != 0; }
 
-  // The number of a root whose subtree's numbers are good, as they are assigned; and of a root whose
-  // subtree's numbers are not good, where the tree has several roots.
+  // The number of a root whose subtree's numbers are good, as they are assigned; and of a root
+  // whose subtree's numbers are not good, where the tree has several roots.
   static constexpr uint32_t firstOrderNumber = 1;
   static constexpr uint32_t staleRoot = 0;
   // Makes the numbers under this root good, by one thread at a time.

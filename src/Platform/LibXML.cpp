@@ -1,0 +1,296 @@
+#include "Platform/LibXML.h"
+
+#include <libxml/parser.h>
+#include <libxml/parserInternals.h>
+#include <libxml/SAX2.h>
+#include <libxml/tree.h>
+#include <libxml/xmlerror.h>
+
+#include <algorithm>
+#include <climits>
+#include <cstring>
+#include <memory>
+#include <mutex>
+#include <new>
+
+namespace xquery {
+
+namespace {
+
+// One parse. Exceptions do not cross libxml2's C frames: a callback that fails notes the failure
+// and stops the parser, and every callback that is still called afterwards does nothing. The
+// content of an entity is parsed by an inner parser of libxml2's, which calls the same functions.
+class Parse {
+ public:
+  Parse(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error)
+      : _read(read), _handler(handler), _error(error) {}
+  bool run();
+
+ private:
+  static xmlSAXHandler callbacks();
+  static Parse& of(void* self) { return *static_cast<Parse*>(self); }
+  template <class Function>
+  void guarded(Function function);
+  void fail(const char* message);
+  void failAt(const char* message, int64_t line, int64_t column);
+  bool hasReadAll();
+  bool mayExpand(size_t bytes);
+  // Comments and instructions of the internal subset are no nodes of the document.
+  bool isInsideDTD() const { return _parser->inSubset != 0; }
+
+  static int readInput(void* self, char* buffer, int size);
+  static void startDocument(void* self);
+  static void internalSubset(void* self, const xmlChar* name, const xmlChar* publicID,
+                             const xmlChar* systemID);
+  static void entityDecl(void* self, const xmlChar* name, int type, const xmlChar* publicID,
+                         const xmlChar* systemID, xmlChar* content);
+  static void unparsedEntityDecl(void* self, const xmlChar* name, const xmlChar* publicID,
+                                 const xmlChar* systemID, const xmlChar* notation);
+  static xmlEntityPtr getEntity(void* self, const xmlChar* name);
+  static xmlEntityPtr getParameterEntity(void* self, const xmlChar* name);
+  xmlEntityPtr permitted(xmlEntityPtr entity);
+  static void startElement(void* self, const xmlChar* localName, const xmlChar* prefix,
+                           const xmlChar* URI, int namespaceCount, const xmlChar** namespaces,
+                           int attributeCount, int defaultedCount, const xmlChar** attributes);
+  static void endElement(void* self, const xmlChar*, const xmlChar*, const xmlChar*);
+  static void characters(void* self, const xmlChar* text, int length);
+  static void CDATABlock(void* self, const xmlChar* text, int length);
+  static void comment(void* self, const xmlChar* text);
+  static void processingInstruction(void* self, const xmlChar* target, const xmlChar* text);
+  static void reference(void* self, const xmlChar* name);
+  static void hearError(void* self, xmlError* error);
+
+  const LibXMLReader& _read;
+  LibXMLHandler& _handler;
+  NSXMLParseError& _error;
+  xmlParserCtxt* _parser = nullptr;
+  size_t _bytesRead = 0;
+  size_t _bytesExpanded = 0;
+  bool _reachedEnd = false;
+  bool _failed = false;
+};
+
+std::string_view viewOf(const xmlChar* text, size_t length) {
+  return {reinterpret_cast<const char*>(text), length};
+}
+
+std::string_view viewOf(const xmlChar* text) {
+  return text ? std::string_view(reinterpret_cast<const char*>(text)) : std::string_view();
+}
+
+// --- failures --------------------------------------------------------------------------------
+
+void Parse::failAt(const char* message, int64_t line, int64_t column) {
+  if (!_failed) {
+    _failed = true;
+    std::string_view text = message ? message : "not well formed";
+    while (!text.empty() && (text.back() == '\n' || text.back() == ' ')) text.remove_suffix(1);
+    _error.message = text;
+    _error.line = line;
+    _error.column = column;
+  }
+  xmlStopParser(_parser);
+}
+
+void Parse::fail(const char* message) {
+  const xmlParserInput* input = _parser->input;
+  failAt(message, input ? input->line : 1, input ? input->col : 1);
+}
+
+template <class Function>
+void Parse::guarded(Function function) {
+  if (_failed) return;
+  try {
+    function();
+  } catch (const LibXMLStop& stop) {
+    fail(stop.message);
+  } catch (const std::bad_alloc&) {
+    fail("out of memory");
+  }
+}
+
+void Parse::hearError(void* self, xmlError* error) {
+  Parse& parse = of(self);
+  // Warnings, for example of a namespace URI that is relative, do not make a document bad.
+  if (parse._failed || error->level < XML_ERR_ERROR) return;
+  parse.failAt(error->message, error->line, error->int2);
+}
+
+// --- input -----------------------------------------------------------------------------------
+
+int Parse::readInput(void* self, char* buffer, int size) {
+  Parse& parse = of(self);
+  if (parse._failed || parse._reachedEnd) return 0;
+  ptrdiff_t count = -1;
+  parse.guarded([&] { count = parse._read(buffer, static_cast<size_t>(size)); });
+  if (parse._failed) return 0;
+  if (count < 0) {
+    parse.failAt("the input cannot be read", 0, 0);
+    return 0;
+  }
+  if (count == 0) parse._reachedEnd = true;
+  parse._bytesRead += static_cast<size_t>(count);
+  return static_cast<int>(count);
+}
+
+// libxml2 takes a zero byte after the root element for the end of the input.
+bool Parse::hasReadAll() {
+  const xmlParserInput* input = _parser->input;
+  if (input && input->cur < input->end) return false;
+  char byte = 0;
+  return readInput(this, &byte, 1) == 0;
+}
+
+// --- entities --------------------------------------------------------------------------------
+
+bool Parse::mayExpand(size_t bytes) {
+  // What a reference costs apart from its text, so that empty entities are bounded too.
+  constexpr size_t costOfReference = 32;
+  _bytesExpanded += bytes + costOfReference;
+  return _bytesExpanded <= std::max(LibXMLEntityBytes, _bytesRead * LibXMLEntityFactor);
+}
+
+xmlEntityPtr Parse::permitted(xmlEntityPtr entity) {
+  if (!entity) return nullptr;
+  if (entity->etype == XML_EXTERNAL_GENERAL_PARSED_ENTITY ||
+      entity->etype == XML_EXTERNAL_PARAMETER_ENTITY) {
+    fail("external entities are not read");
+    return nullptr;
+  }
+  if (entity->etype != XML_INTERNAL_PREDEFINED_ENTITY &&
+      !mayExpand(static_cast<size_t>(entity->length))) {
+    fail("entities expand to too much text");
+    return nullptr;
+  }
+  return entity;
+}
+
+xmlEntityPtr Parse::getEntity(void* self, const xmlChar* name) {
+  Parse& parse = of(self);
+  return parse._failed ? nullptr : parse.permitted(xmlSAX2GetEntity(parse._parser, name));
+}
+
+xmlEntityPtr Parse::getParameterEntity(void* self, const xmlChar* name) {
+  Parse& parse = of(self);
+  return parse._failed ? nullptr : parse.permitted(xmlSAX2GetParameterEntity(parse._parser, name));
+}
+
+// libxml2 keeps the declared entities in a document of its own, which holds nothing else.
+void Parse::startDocument(void* self) {
+  xmlSAX2StartDocument(of(self)._parser);
+}
+
+void Parse::internalSubset(void* self, const xmlChar* name, const xmlChar* publicID,
+                           const xmlChar* systemID) {
+  xmlSAX2InternalSubset(of(self)._parser, name, publicID, systemID);
+}
+
+void Parse::entityDecl(void* self, const xmlChar* name, int type, const xmlChar* publicID,
+                       const xmlChar* systemID, xmlChar* content) {
+  xmlSAX2EntityDecl(of(self)._parser, name, type, publicID, systemID, content);
+}
+
+void Parse::unparsedEntityDecl(void* self, const xmlChar* name, const xmlChar* publicID,
+                               const xmlChar* systemID, const xmlChar* notation) {
+  xmlSAX2UnparsedEntityDecl(of(self)._parser, name, publicID, systemID, notation);
+}
+
+// Called for what was not substituted: leaving it out would lose text in silence.
+void Parse::reference(void* self, const xmlChar*) {
+  Parse& parse = of(self);
+  if (!parse._failed) parse.fail("reference to an entity that is not defined");
+}
+
+// --- content ---------------------------------------------------------------------------------
+
+void Parse::startElement(void* self, const xmlChar* localName, const xmlChar* prefix,
+                         const xmlChar* URI, int namespaceCount, const xmlChar** namespaces,
+                         int attributeCount, int, const xmlChar** attributes) {
+  Parse& parse = of(self);
+  parse.guarded([&] {
+    parse._handler.startElement({localName, prefix, URI},
+                                LibXMLNamespaces(namespaces, namespaceCount),
+                                LibXMLAttributes(attributes, attributeCount));
+  });
+}
+
+void Parse::endElement(void* self, const xmlChar*, const xmlChar*, const xmlChar*) {
+  Parse& parse = of(self);
+  parse.guarded([&] { parse._handler.endElement(); });
+}
+
+void Parse::characters(void* self, const xmlChar* text, int length) {
+  Parse& parse = of(self);
+  parse.guarded([&] { parse._handler.characters(viewOf(text, static_cast<size_t>(length))); });
+}
+
+void Parse::CDATABlock(void* self, const xmlChar* text, int length) {
+  Parse& parse = of(self);
+  parse.guarded([&] { parse._handler.CDATA(viewOf(text, static_cast<size_t>(length))); });
+}
+
+void Parse::comment(void* self, const xmlChar* text) {
+  Parse& parse = of(self);
+  if (!parse.isInsideDTD()) parse.guarded([&] { parse._handler.comment(viewOf(text)); });
+}
+
+void Parse::processingInstruction(void* self, const xmlChar* target, const xmlChar* text) {
+  Parse& parse = of(self);
+  if (parse.isInsideDTD()) return;
+  parse.guarded([&] { parse._handler.processingInstruction(target, viewOf(text)); });
+}
+
+xmlSAXHandler Parse::callbacks() {
+  xmlSAXHandler handler;
+  std::memset(&handler, 0, sizeof handler);
+  handler.initialized = XML_SAX2_MAGIC;
+  handler.startDocument = startDocument;
+  handler.internalSubset = internalSubset;
+  handler.entityDecl = entityDecl;
+  handler.unparsedEntityDecl = unparsedEntityDecl;
+  handler.getEntity = getEntity;
+  handler.getParameterEntity = getParameterEntity;
+  handler.reference = reference;
+  handler.startElementNs = startElement;
+  handler.endElementNs = endElement;
+  handler.characters = characters;
+  handler.ignorableWhitespace = characters;
+  handler.cdataBlock = CDATABlock;
+  handler.comment = comment;
+  handler.processingInstruction = processingInstruction;
+  handler.serror = hearError;
+  return handler;
+}
+
+// --- the whole -------------------------------------------------------------------------------
+
+struct FreeParser {
+  void operator()(xmlParserCtxt* parser) const {
+    xmlFreeDoc(parser->myDoc);
+    parser->myDoc = nullptr;
+    xmlFreeParserCtxt(parser);
+  }
+};
+
+bool Parse::run() {
+  xmlSAXHandler handler = callbacks();
+  const std::unique_ptr<xmlParserCtxt, FreeParser> parser(
+      xmlCreateIOParserCtxt(&handler, this, readInput, nullptr, this, XML_CHAR_ENCODING_NONE));
+  if (!parser) throw std::bad_alloc();
+  _parser = parser.get();
+  xmlCtxtUseOptions(_parser, XML_PARSE_HUGE | XML_PARSE_NOENT | XML_PARSE_NONET);
+  const bool isWellFormed = xmlParseDocument(_parser) == 0 && _parser->wellFormed;
+  if (!_failed && !isWellFormed) fail(nullptr);
+  if (!_failed && !hasReadAll()) fail("extra content at the end of the document");
+  return !_failed;
+}
+
+}  // namespace
+
+bool parseWithLibXML(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error) {
+  static std::once_flag initialised;
+  std::call_once(initialised, xmlInitParser);
+  return Parse(read, handler, error).run();
+}
+
+}  // namespace xquery

@@ -1,0 +1,88 @@
+// libxml2, as the source of a document's events. Nothing else of the library includes its headers.
+//
+// Well-formedness, namespaces, encodings and internal entities are its work. External entities and
+// external DTDs are never read: a reference to one is an error. Depth and the length of texts are
+// bounded by memory only.
+#pragma once
+
+#include "xquery/XMLNode.h"
+
+#include <cstddef>
+#include <functional>
+#include <string_view>
+
+namespace xquery {
+
+// Text of names: UTF-8 ended by a zero byte, null for none. Equal texts have equal addresses while
+// one document is parsed.
+using LibXMLText = const unsigned char*;
+
+struct LibXMLName {
+  LibXMLText localName;
+  LibXMLText prefix;
+  LibXMLText URI;
+};
+
+class LibXMLNamespaces {
+ public:
+  LibXMLNamespaces(const LibXMLText* fields, int count) : _fields(fields), _count(count) {}
+  int count() const { return _count; }
+  LibXMLText prefix(int index) const { return _fields[2 * index]; }
+  LibXMLText URI(int index) const { return _fields[2 * index + 1]; }
+
+ private:
+  const LibXMLText* _fields;
+  int _count;
+};
+
+class LibXMLAttributes {
+ public:
+  LibXMLAttributes(const LibXMLText* fields, int count) : _fields(fields), _count(count) {}
+  int count() const { return _count; }
+  LibXMLName name(int index) const {
+    const LibXMLText* field = _fields + 5 * index;
+    return {field[0], field[1], field[2]};
+  }
+  std::string_view value(int index) const {
+    const LibXMLText* field = _fields + 5 * index;
+    return {reinterpret_cast<const char*>(field[3]), static_cast<size_t>(field[4] - field[3])};
+  }
+
+ private:
+  const LibXMLText* _fields;
+  int _count;
+};
+
+class LibXMLHandler {
+ public:
+  virtual void startElement(const LibXMLName& name, const LibXMLNamespaces& namespaces,
+                            const LibXMLAttributes& attributes) = 0;
+  virtual void endElement() = 0;
+  // Adjacent text may come in several pieces.
+  virtual void characters(std::string_view text) = 0;
+  virtual void CDATA(std::string_view text) = 0;
+  virtual void comment(std::string_view text) = 0;
+  virtual void processingInstruction(LibXMLText target, std::string_view text) = 0;
+
+ protected:
+  ~LibXMLHandler() = default;
+};
+
+// What a handler throws to end the parse; the place is filled in.
+struct LibXMLStop {
+  const char* message;
+};
+
+// Fills the buffer; answers the number of bytes, 0 at the end of the input, negative on failure.
+using LibXMLReader = std::function<ptrdiff_t(char* buffer, size_t size)>;
+
+// What entities add to a document is at most the larger of these: an absolute number of bytes, and
+// a multiple of the bytes read so far. Each reference counts for the text of its entity and a few
+// bytes more.
+constexpr size_t LibXMLEntityBytes = size_t{10} << 20;
+constexpr size_t LibXMLEntityFactor = 20;
+
+// Whether the document was well formed; else `error` says what is wrong, and where.
+bool parseWithLibXML(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error);
+
+}  // namespace xquery
