@@ -44,7 +44,7 @@ Ref<NSString> plainString(const NSString& text) {
 }
 
 Value toUntypedAtomic(const Cast& cast) {
-  return XQueryStringValue(*cast.object);
+  return plainString(*XQueryStringValue(*cast.object));
 }
 
 Value toStringFamily(const Cast& cast) {
@@ -201,11 +201,9 @@ Value numberToDouble(const Cast& cast) {
     case NSNumber::Storage::UInt64:
     case NSNumber::Storage::Double:
       return doubleNumber(number.doubleValue(), cast.target);
-    case NSNumber::Storage::Decimal: {
-      const NSDecimal value = number.decimalValue();
-      if (!value.isSmallInteger()) break;
-      return doubleNumber(static_cast<double>(value.smallInteger()), cast.target);
-    }
+    case NSNumber::Storage::Decimal:
+      if (!number.storedDecimal()->isSmallInteger()) break;
+      return doubleNumber(static_cast<double>(number.storedDecimal()->smallInteger()), cast.target);
     default:
       break;
   }

@@ -22,7 +22,8 @@ XQueryQName::XQueryQName(Ref<NSString> namespaceURI, Ref<NSString> localPart,
     : NSCounted(Kind::QName),
       _namespaceURI(std::move(namespaceURI)),
       _localPart(std::move(localPart)),
-      _prefixHint(std::move(prefixHint)) {}
+      _prefixHint(std::move(prefixHint)),
+      _hash(_localPart->hash()) {}
 
 Ref<XQueryQName> XQueryQName::qname(const Ref<NSString>& name, const Ref<NSString>& forNamespace) {
   Ref<NSString> prefix;
@@ -63,8 +64,8 @@ void XQueryQName::parseQNameString(NSStringView name, Range& prefixRange, Range&
 }
 
 bool XQueryQName::isEqual(const XQueryQName& other) const {
-  return this == &other ||
-         (sameText(_localPart, other._localPart) && sameText(_namespaceURI, other._namespaceURI));
+  return this == &other || (_hash == other._hash && sameText(_localPart, other._localPart) &&
+                            sameText(_namespaceURI, other._namespaceURI));
 }
 
 Ref<NSString> XQueryQName::XQueryStringValue() const {

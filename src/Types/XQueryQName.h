@@ -37,7 +37,8 @@ class XQueryQName : public NSCounted {
   const Ref<NSString>& prefixHint() const { return _prefixHint; }
   // Namespace and local part; the hint plays no part.
   bool isEqual(const XQueryQName& other) const;
-  uint32_t hash() const { return _localPart->hash(); }
+  // The local part's hash; names are keys of every table of variables and functions, so it is kept.
+  uint32_t hash() const { return _hash; }
   // prefix:local, or the local part without a hint.
   Ref<NSString> XQueryStringValue() const;
   Ref<NSString> description() const;
@@ -55,6 +56,7 @@ class XQueryQName : public NSCounted {
   Ref<NSString> _localPart;
   Ref<NSString> _prefixHint;
   mutable NSXMLExpandedNameRef _expandedName;
+  uint32_t _hash;
   mutable bool _isInterned = false;
 };
 
