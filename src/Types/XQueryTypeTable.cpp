@@ -14,6 +14,7 @@
 #include "xquery/Number.h"
 
 #include <array>
+#include <new>
 #include <unordered_map>
 
 namespace xquery {
@@ -135,7 +136,8 @@ Ref<NSString> immortalText(const char* text) {
   return string;
 }
 
-// The two tables. Both live as long as the process and never change.
+// The two tables. They never change and are never destroyed, so that what runs at exit may still
+// ask for types.
 struct TypeTables {
   std::vector<Value> sXQueryTypeNames;
   std::unordered_map<Ref<XQueryQName>, XQueryTypeID, XQueryQNameHash, XQueryQNameEqual>
@@ -155,8 +157,9 @@ struct TypeTables {
 };
 
 const TypeTables& typeTables() {
-  static const TypeTables tables;
-  return tables;
+  alignas(TypeTables) static unsigned char storage[sizeof(TypeTables)];
+  static const TypeTables* const tables = ::new (storage) TypeTables;
+  return *tables;
 }
 
 // Both are integer types, a < b.
