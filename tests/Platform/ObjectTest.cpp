@@ -1,0 +1,176 @@
+#include "xquery/Collection.h"
+#include "xquery/Number.h"
+#include "xquery/Object.h"
+
+#include <gtest/gtest.h>
+
+#include <array>
+#include <set>
+#include <thread>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+int livingObjects = 0;
+
+// One more block size than the free lists serve.
+template <size_t Bytes>
+class Sized : public NSCounted {
+ public:
+  explicit Sized(unsigned char fill) : NSCounted(Kind::Internal) {
+    ++livingObjects;
+    _bytes.fill(fill);
+  }
+  ~Sized() override { --livingObjects; }
+  bool holds(unsigned char fill) const {
+    for (const unsigned char byte : _bytes) {
+      if (byte != fill) return false;
+    }
+    return true;
+  }
+
+ private:
+  std::array<unsigned char, Bytes> _bytes;
+};
+
+class Link : public NSCounted {
+ public:
+  explicit Link(Value next) : NSCounted(Kind::Internal), _next(std::move(next)) { ++livingObjects; }
+  ~Link() override { --livingObjects; }
+
+ private:
+  Value _next;
+};
+
+template <size_t Bytes>
+void keepManyAndCheck() {
+  std::vector<Ref<Sized<Bytes>>> objects;
+  for (int round = 0; round < 3; ++round) {
+    for (int index = 0; index < 2000; ++index) {
+      objects.push_back(make<Sized<Bytes>>(static_cast<unsigned char>(index)));
+    }
+    for (size_t index = 0; index < objects.size(); ++index) {
+      ASSERT_TRUE(objects[index]->holds(static_cast<unsigned char>(index % 2000)));
+    }
+    EXPECT_EQ(livingObjects, 2000);
+    objects.clear();
+    EXPECT_EQ(livingObjects, 0);
+  }
+}
+
+TEST(Object, BlocksOfEverySizeKeepTheirContentsApart) {
+  keepManyAndCheck<1>();
+  keepManyAndCheck<16>();
+  keepManyAndCheck<17>();
+  keepManyAndCheck<48>();
+  keepManyAndCheck<100>();
+  keepManyAndCheck<112>();  // with the header just inside the largest block
+  keepManyAndCheck<113>();  // and just outside it
+  keepManyAndCheck<500>();
+}
+
+TEST(Object, CountFollowsReferences) {
+  Ref<Sized<8>> first = make<Sized<8>>(static_cast<unsigned char>(1));
+  EXPECT_TRUE(first->hasOneReference());
+  Value second = first;
+  EXPECT_FALSE(first->hasOneReference());
+  Value moved = std::move(second);
+  EXPECT_FALSE(second);
+  moved = nullptr;
+  EXPECT_TRUE(first->hasOneReference());
+  EXPECT_EQ(livingObjects, 1);
+  first = nullptr;
+  EXPECT_EQ(livingObjects, 0);
+}
+
+TEST(Object, SelfAssignmentKeepsTheObject) {
+  Value value = make<Sized<8>>(static_cast<unsigned char>(1));
+  const Value& same = value;
+  value = same;
+  EXPECT_EQ(livingObjects, 1);
+  value = nullptr;
+  EXPECT_EQ(livingObjects, 0);
+}
+
+TEST(Object, ImmortalObjectsSurviveEveryRelease) {
+  NSNull* null = NSNull::null();
+  ASSERT_TRUE(null->isImmortal());
+  for (int round = 0; round < 10; ++round) null->release();
+  for (int round = 0; round < 10; ++round) {
+    Value reference = null;
+    EXPECT_EQ(reference->kind(), Kind::Null);
+  }
+  EXPECT_TRUE(null->isImmortal());
+  EXPECT_EQ(NSNull::null(), null);
+}
+
+TEST(Object, ChainOfAMillionObjectsIsFreedWithoutRecursion) {
+  Value chain;
+  for (int index = 0; index < 1000000; ++index) chain = make<Link>(std::move(chain));
+  EXPECT_EQ(livingObjects, 1000000);
+  chain = nullptr;
+  EXPECT_EQ(livingObjects, 0);
+}
+
+TEST(Object, DeepArraysOfManyObjectsAreFreedCompletely) {
+  Value nested;
+  for (int depth = 0; depth < 300; ++depth) {
+    std::vector<Value> elements;
+    for (int index = 0; index < 50; ++index) {
+      elements.push_back(make<Sized<8>>(static_cast<unsigned char>(index)));
+    }
+    elements.push_back(nested);
+    nested = NSArray::arrayWithObjects(std::move(elements));
+  }
+  EXPECT_EQ(livingObjects, 300 * 50);
+  nested = nullptr;
+  EXPECT_EQ(livingObjects, 0);
+}
+
+TEST(Object, ObjectsMadeByOneThreadAreFreedByAnother) {
+  for (int round = 0; round < 20; ++round) {
+    std::vector<Value> made;
+    std::thread maker([&made] {
+      for (int64_t index = 0; index < 5000; ++index) {
+        made.push_back(NSNumber::numberWithLongLong(index));
+      }
+    });
+    maker.join();
+    std::thread breaker([&made] {
+      for (size_t index = 0; index < made.size(); ++index) {
+        ASSERT_EQ(cast<NSNumber>(made[index])->longLongValue(), static_cast<int64_t>(index));
+      }
+      made.clear();
+    });
+    breaker.join();
+  }
+}
+
+TEST(Object, SharedReferencesAreCountedByAllThreads) {
+  const Ref<NSNumber> number = NSNumber::numberWithLongLong(7);
+  std::vector<std::thread> threads;
+  for (int index = 0; index < 4; ++index) {
+    threads.emplace_back([&number] {
+      for (int round = 0; round < 20000; ++round) {
+        Value copy = number;
+        Value another = copy;
+      }
+    });
+  }
+  for (std::thread& thread : threads) thread.join();
+  EXPECT_TRUE(number->hasOneReference());
+}
+
+TEST(Object, KindTestsAcceptNull) {
+  const Value none;
+  EXPECT_FALSE(isa<NSArray>(none));
+  EXPECT_EQ(dyn_cast<NSArray>(none), nullptr);
+  const Value array = NSArray::array();
+  EXPECT_TRUE(isa<NSArray>(array));
+  EXPECT_FALSE(isa<NSNumber>(array));
+  EXPECT_EQ(dyn_cast<NSNumber>(array), nullptr);
+}
+
+}  // namespace
+}  // namespace xquery
