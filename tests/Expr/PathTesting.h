@@ -7,6 +7,7 @@
 #include "Expr/XQueryNameTest.h"
 #include "Expr/XQueryPath.h"
 #include "Expr/XQueryTypeDeclaration.h"
+#include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
 #include "xquery/Collection.h"

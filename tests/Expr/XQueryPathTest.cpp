@@ -256,7 +256,7 @@ TEST_F(Path, RootStepNeedsADocumentAtTheTop) {
 TEST_F(Path, DoubleSlashFindsAtAnyDepth) {
   EXPECT_EQ(shownFrom(at("d1"), {rootStep(), anyDepth(), child("b")}), "b1 b2");
   EXPECT_EQ(shownFrom(document, {rootStep(), anyDepth(), step(XQueryAxisChild, anyName())}),
-            "r a1 b1 b2 a2 c1 d1 e1 f1 f2 g1");
+            "r a1 b1 b2 a2 c1 d1 pi(p) e1 f1 f2 g1");
   EXPECT_EQ(shownFrom(document, {rootStep(), anyDepth(), step(XQueryAxisAttribute, name("x"))}),
             "@x");
 }
@@ -277,7 +277,7 @@ TEST_F(Path, SiblingsYieldTheirParentOnce) {
 TEST_F(Path, UnorderedResultsKeepTheOrderOfTheWalkWithoutDuplicates) {
   const Steps everyChild = {rootStep(), anyDepth(), step(XQueryAxisChild, anyName())};
   context->_internal().setOrdered(false);
-  EXPECT_EQ(shownFrom(document, everyChild), "r a1 a2 e1 b1 b2 c1 d1 f1 f2 g1");
+  EXPECT_EQ(shownFrom(document, everyChild), "r a1 a2 pi(p) e1 b1 b2 c1 d1 f1 f2 g1");
   const Steps ancestors = {rootStep(), anyDepth(), child("f"),
                            step(XQueryAxisAncestorOrSelf, anyName())};
   EXPECT_EQ(shownFrom(document, ancestors), "f1 e1 r f2");
@@ -287,7 +287,7 @@ TEST_F(Path, ANumberInAForwardAndAReverseStepCountsAlongTheAxis) {
   EXPECT_EQ(shownFrom(at("r"), {step(XQueryAxisChild, anyName(), {integer("1")})}), "a1");
   EXPECT_EQ(shownFrom(at("d1"), {step(XQueryAxisAncestor, anyName(), {integer("1")})}), "c1");
   EXPECT_EQ(shownFrom(at("d1"), {step(XQueryAxisPreceding, anyName(), {integer("1")})}), "b2");
-  EXPECT_EQ(shownFrom(at("e1"), {step(XQueryAxisPrecedingSibling, anyName(), {integer("3")})}),
+  EXPECT_EQ(shownFrom(at("e1"), {step(XQueryAxisPrecedingSibling, anyName(), {integer("2")})}),
             "a2");
 }
 
@@ -342,12 +342,9 @@ TEST_F(Path, AFilterStepSeesEachItemWithItsPositionAndTheSize) {
 }
 
 TEST_F(Path, AFilterStepAtTheEndMayGiveAtomicValues) {
-  EXPECT_EQ(shownFrom(at("r"), {child("a"), filterStep(probe([](XQueryContext& c) {
-                                  return Value(c._internal().contextItem()) == nullptr
-                                             ? Value()
-                                             : Value(text("v"));
-                                }))}),
-            "v v");
+  const auto freshValue =
+      probe([](XQueryContext& c) -> Value { return text(shown(c._internal().contextItem())); });
+  EXPECT_EQ(shownFrom(at("r"), {child("a"), filterStep(freshValue)}), "a1 a2");
 }
 
 TEST_F(Path, TheSameLiteralForEveryContextNodeCountsOnce) {
