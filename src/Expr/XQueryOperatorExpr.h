@@ -1,4 +1,9 @@
-// Binary (and unary) operators.
+// Binary operators, and the unary signs.
+//
+// The class methods work on values that are evaluated already; functions that add, divide or
+// compare call them as well. They take the operator code, the left and the right value. Where an
+// operator has a shortcut for common operands, the plain algorithm that defines the answer stays
+// callable beside it (XQueryArithmetic.h, XQueryComparison.h).
 #pragma once
 
 #include "Expr/XQueryExpr.h"
@@ -40,7 +45,8 @@ class XQueryOperatorExpr : public XQueryExpr {
   static bool classof(const NSObject& object) { return object.kind() == Kind::OperatorExpr; }
 
   // A null operand (one that is absent from the query) is the empty sequence.
-  [[nodiscard]] static Ref<XQueryOperatorExpr> operatorExpr(int type, Ref<XQueryExpr> withRightExpr);
+  [[nodiscard]] static Ref<XQueryOperatorExpr> operatorExpr(int type,
+                                                            Ref<XQueryExpr> withRightExpr);
   // Plus and minus whose left operand was never set are the unary signs. A null argument is a left
   // operand that is absent from the query: it is set, to the empty sequence, so that a binary
   // operator with an absent operand is not taken for a sign.
@@ -49,15 +55,21 @@ class XQueryOperatorExpr : public XQueryExpr {
   XQueryExpr* left() const { return _left.get(); }
   XQueryExpr* right() const { return _right.get(); }
   int operatorType() const { return _type; }
+  // Unary plus or minus.
+  bool isSign() const {
+    return !_left && (_type == XQueryOperatorPlus || _type == XQueryOperatorMinus);
+  }
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value evaluateWithContext(XQueryContext& context) const override;
 
   // 1 logical, 2 arithmetic, 3 range, 4 sequence, 5 value, 6 general, 7 node comparison; else 0.
   static int operatorClassification(int type);
-  // Work on evaluated operands. They answer a value shape, or null when the operands are invalid.
+  // Dispatches on the class. Invalid operands raise error 6 "invalid type for operator", and an
+  // error record among the answers is raised.
   static Value evaluateOperator(int type, const Value& withLeft, const Value& right,
                                 XQueryContext& forContext);
+  // One class each. They answer a value shape or an error record, or null for invalid operands.
   static Value logicalOperatorEvaluate(int type, const Value& withLeft, const Value& right,
                                        XQueryContext& forContext);
   static Value arithmeticOperatorEvaluate(int type, const Value& withLeft, const Value& right,
@@ -83,6 +95,9 @@ class XQueryOperatorExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  Value evaluateWithLeftValue(const Value& left, XQueryContext& context) const;
+  Value leftOrEmpty(const Value& left) const;
+
   int _type;
   Ref<XQueryExpr> _left;
   Ref<XQueryExpr> _right;

@@ -1,0 +1,341 @@
+#include "Expr/XQueryArithmetic.h"
+
+#include "Expr/XQueryOperatorExpr.h"
+#include "Expr/XQuerySequence.h"
+#include "Types/XQueryAtomization.h"
+#include "Types/XQueryCasting.h"
+#include "Types/XQueryNumber.h"
+#include "Types/XQueryTypeTable.h"
+#include "xquery/Collection.h"
+#include "xquery/Error.h"
+
+#include <array>
+#include <cmath>
+#include <cstdint>
+
+namespace xquery {
+namespace {
+
+// One operation in the three representations. Functions, so that each row below is one fact.
+struct NumericWork {
+  NSDecimal (*exact)(const NSDecimal&, const NSDecimal&);
+  float (*single)(float, float);
+  double (*wide)(double, double);
+};
+
+constexpr NumericWork addition = {
+    [](const NSDecimal& a, const NSDecimal& b) { return a.add(b); },
+    [](float a, float b) { return a + b; },
+    [](double a, double b) { return a + b; },
+};
+constexpr NumericWork subtraction = {
+    [](const NSDecimal& a, const NSDecimal& b) { return a.subtract(b); },
+    [](float a, float b) { return a - b; },
+    [](double a, double b) { return a - b; },
+};
+constexpr NumericWork multiplication = {
+    [](const NSDecimal& a, const NSDecimal& b) { return a.multiply(b); },
+    [](float a, float b) { return a * b; },
+    [](double a, double b) { return a * b; },
+};
+constexpr NumericWork division = {
+    [](const NSDecimal& a, const NSDecimal& b) { return a.divide(b); },
+    [](float a, float b) { return XQueryQuotient(a, b); },
+    [](double a, double b) { return XQueryQuotient(a, b); },
+};
+constexpr NumericWork remainder = {
+    [](const NSDecimal& a, const NSDecimal& b) { return a.remainder(b); },
+    [](float a, float b) { return std::fmod(a, b); },
+    [](double a, double b) { return std::fmod(a, b); },
+};
+constexpr NumericWork integerDivision = {
+    [](const NSDecimal& a, const NSDecimal& b) { return a.integerDivide(b); },
+    [](float a, float b) { return std::trunc(XQueryQuotient(a, b)); },
+    [](double a, double b) { return std::trunc(XQueryQuotient(a, b)); },
+};
+
+const NSNumber& numberIn(const Value& value) {
+  return *cast<NSNumber>(value.get());
+}
+
+// Not yet of the type: a decimal or a double, which the caller casts. Null when the type is not
+// numeric.
+Value compute(const NumericWork& work, const NSNumber& a, const NSNumber& b, XQueryTypeID type) {
+  switch (XQueryPrimitiveTypeForTypeID(type)) {
+    case XQueryTypeDecimal:
+      return XQueryNumber::numberWithDecimal(work.exact(a.decimalValue(), b.decimalValue()));
+    case XQueryTypeFloat:
+      return XQueryNumber::numberWithFloat(work.single(a.floatValue(), b.floatValue()));
+    case XQueryTypeDouble:
+      return XQueryNumber::numberWithDouble(work.wide(a.doubleValue(), b.doubleValue()));
+    default:
+      return Value();
+  }
+}
+
+struct Operands {
+  XQueryTypeID type;  // 0 when there is no common numeric type
+  Value left;
+  Value right;
+};
+
+// Both operands in one type: `type`.
+Operands castBoth(const Value& a, const Value& b, XQueryTypeID type, XQueryContext& context) {
+  return {type, XQueryCastAsTypeForContext(a, type, context),
+          XQueryCastAsTypeForContext(b, type, context)};
+}
+
+XQueryTypeID commonType(const Value& a, const Value& b) {
+  return XQueryLeastCommonNumericType(XQueryObjectTypeID(a.get()), XQueryObjectTypeID(b.get()));
+}
+
+// The common type for the operators whose result is not of the operands' integer type: any two
+// integers meet in decimal.
+XQueryTypeID commonTypeForDivision(const Value& a, const Value& b) {
+  const XQueryTypeID type = commonType(a, b);
+  return type >= XQueryTypeInteger ? XQueryTypeDecimal : type;
+}
+
+bool isZero(const Value& number) {
+  return numberIn(number).compare(*XQueryNumber::zero()) == 0;
+}
+
+bool isExact(XQueryTypeID type) {
+  return XQueryPrimitiveTypeForTypeID(type) == XQueryTypeDecimal;
+}
+
+Value divisionByZero() {
+  return XQueryError::error(6, "Division by zero");
+}
+
+Value calculateInCommonType(const NumericWork& work, const Value& a, const Value& b,
+                            XQueryContext& context) {
+  const XQueryTypeID type = commonType(a, b);
+  if (type == XQueryTypeNone) return Value();
+  const Operands operands = castBoth(a, b, type, context);
+  const Value result =
+      compute(work, numberIn(operands.left), numberIn(operands.right), operands.type);
+  return XQueryCastAsTypeForContext(result, type, context);
+}
+
+// --- products of special numbers -----------------------------------------------------------------
+
+enum Magnitude : size_t {
+  NotANumber,
+  NegativeInfinity,
+  Negative,
+  Zero,
+  Positive,
+  PositiveInfinity
+};
+
+Magnitude magnitudeOf(const NSNumber& number) {
+  const double value = number.doubleValue();
+  if (std::isnan(value)) return NotANumber;
+  if (std::isinf(value)) return value < 0 ? NegativeInfinity : PositiveInfinity;
+  return value < 0 ? Negative : value > 0 ? Positive : Zero;
+}
+
+enum Special : uint8_t { N, M, P, X };  // NaN, minus and plus infinity; X: no special operand
+
+// Rows: the left operand; columns: the right one; both in the order of Magnitude.
+constexpr std::array<std::array<Special, 6>, 6> specialProducts = {{
+    {N, N, N, N, N, N},  // NaN
+    {N, P, P, N, M, M},  // minus infinity
+    {N, P, X, X, X, M},  // negative
+    {N, N, X, X, X, N},  // zero
+    {N, M, X, X, X, P},  // positive
+    {N, M, M, N, P, P},  // plus infinity
+}};
+
+// Null when neither operand is special after all.
+Value specialProduct(const NSNumber& a, const NSNumber& b) {
+  switch (specialProducts[magnitudeOf(a)][magnitudeOf(b)]) {
+    case N:
+      return XQueryNumber::nan();
+    case M:
+      return XQueryNumber::negInf();
+    case P:
+      return XQueryNumber::posInf();
+    case X:
+      break;
+  }
+  return Value();
+}
+
+}  // namespace
+
+// --- the numeric helpers -------------------------------------------------------------------------
+
+double XQueryQuotient(double a, double b) {
+  if (b != 0) return a / b;
+  if (a < 0) return -INFINITY;
+  return a > 0 ? INFINITY : NAN;
+}
+
+float XQueryQuotient(float a, float b) {
+  if (b != 0) return a / b;
+  if (a < 0) return -INFINITY;
+  return a > 0 ? INFINITY : NAN;
+}
+
+Value op_numeric_add(const Value& a, const Value& b, XQueryContext& context) {
+  return calculateInCommonType(addition, a, b, context);
+}
+
+Value op_numeric_subtract(const Value& a, const Value& b, XQueryContext& context) {
+  return calculateInCommonType(subtraction, a, b, context);
+}
+
+Value op_numeric_multiply(const Value& a, const Value& b, XQueryContext& context) {
+  const XQueryTypeID type = commonType(a, b);
+  if (type == XQueryTypeNone) return Value();
+  const Operands operands = castBoth(a, b, type, context);
+  const NSNumber& left = numberIn(operands.left);
+  const NSNumber& right = numberIn(operands.right);
+  if (XQueryNumber::isSpecial(&left) || XQueryNumber::isSpecial(&right)) {
+    return specialProduct(left, right);
+  }
+  return XQueryCastAsTypeForContext(compute(multiplication, left, right, type), type, context);
+}
+
+Value op_numeric_divide(const Value& a, const Value& b, XQueryContext& context) {
+  const XQueryTypeID type = commonTypeForDivision(a, b);
+  if (type == XQueryTypeNone) return Value();
+  const Operands operands = castBoth(a, b, type, context);
+  if (isExact(type) && isZero(operands.right)) return divisionByZero();
+  const Value result = compute(division, numberIn(operands.left), numberIn(operands.right), type);
+  return XQueryCastAsTypeForContext(result, type, context);
+}
+
+Value op_numeric_integer_divide(const Value& a, const Value& b, XQueryContext& context) {
+  const XQueryTypeID type = commonTypeForDivision(a, b);
+  if (type == XQueryTypeNone) return Value();
+  const Operands operands = castBoth(a, b, type, context);
+  if (isZero(operands.right)) return divisionByZero();
+  const Value result =
+      compute(integerDivision, numberIn(operands.left), numberIn(operands.right), type);
+  return XQueryCastAsTypeForContext(result, XQueryTypeInteger, context);
+}
+
+Value op_numeric_mod(const Value& a, const Value& b, XQueryContext& context) {
+  const XQueryTypeID type = commonType(a, b);
+  if (type == XQueryTypeNone) return Value();
+  if (isExact(type) && isZero(b)) return divisionByZero();
+  return calculateInCommonType(remainder, a, b, context);
+}
+
+bool XQueryIsNaN(const NSNumber& number) {
+  return number.compare(*XQueryNumber::nan()) == 0;
+}
+
+bool op_numeric_equal(const NSNumber& a, const NSNumber& b) {
+  return a.compare(b) == 0 && !XQueryIsNaN(a);
+}
+
+bool op_numeric_less_than(const NSNumber& a, const NSNumber& b) {
+  return a.compare(b) < 0 && !XQueryIsNaN(a);
+}
+
+bool op_numeric_greater_than(const NSNumber& a, const NSNumber& b) {
+  // NaN is below every other number, so it can only be the right operand here.
+  return a.compare(b) > 0 && !XQueryIsNaN(b);
+}
+
+// --- the dispatcher ------------------------------------------------------------------------------
+
+namespace {
+
+// What a row of the dispatch table asks of an operand.
+bool isNumeric(XQueryTypeID type) {
+  return XQueryIsNumericTypeID(type);
+}
+
+struct Row {
+  int type;
+  bool (*left)(XQueryTypeID);
+  bool (*right)(XQueryTypeID);
+  Value (*work)(const Value&, const Value&, XQueryContext&);
+};
+
+constexpr std::array rows = {
+    Row{XQueryOperatorPlus, isNumeric, isNumeric, op_numeric_add},
+    Row{XQueryOperatorMinus, isNumeric, isNumeric, op_numeric_subtract},
+    Row{XQueryOperatorMultiply, isNumeric, isNumeric, op_numeric_multiply},
+    Row{XQueryOperatorDiv, isNumeric, isNumeric, op_numeric_divide},
+    Row{XQueryOperatorIDiv, isNumeric, isNumeric, op_numeric_integer_divide},
+    Row{XQueryOperatorMod, isNumeric, isNumeric, op_numeric_mod},
+};
+
+// A node becomes its untyped value, and an untyped value a number.
+Value asNumberIfUntyped(const Value& operand, XQueryTypeID numberType, XQueryContext& context) {
+  const Value atomic = XQueryIsNode(operand.get()) ? XQueryAtomization(operand, context) : operand;
+  if (XQueryObjectTypeID(atomic.get()) != XQueryTypeUntypedAtomic) return atomic;
+  return XQueryCastAsTypeForContext(atomic, numberType, context);
+}
+
+// idiv has no answer for a zero divisor whatever the type; mod has one in floating point.
+bool dividesByZero(int type, const Value& left, const Value& right) {
+  const auto* divisor = dyn_cast<NSNumber>(right.get());
+  if (!divisor || divisor->compare(*XQueryNumber::zero()) != 0) return false;
+  const XQueryTypeID common = commonType(left, right);
+  if (common == XQueryTypeNone) return false;
+  return type == XQueryOperatorIDiv || (type == XQueryOperatorMod && isExact(common));
+}
+
+}  // namespace
+
+Value XQueryArithmeticPlainly(int type, const Value& left, const Value& right,
+                              XQueryContext& context) {
+  Value a = normalised(left);
+  Value b = normalised(right);
+  if (!a || !b) return Value();
+  if (isNull(a) || isNull(b)) return NSNull::null();
+  if (isa<NSArray>(a) || isa<NSArray>(b)) return Value();
+  const XQueryTypeID untypedAs = type == XQueryOperatorIDiv ? XQueryTypeInteger : XQueryTypeDouble;
+  a = asNumberIfUntyped(a, untypedAs, context);
+  b = asNumberIfUntyped(b, untypedAs, context);
+  if (dividesByZero(type, a, b)) return XQueryError::error(6, "divide by zero");
+  const XQueryTypeID leftType = XQueryObjectTypeID(a.get());
+  const XQueryTypeID rightType = XQueryObjectTypeID(b.get());
+  for (const Row& row : rows) {
+    if (row.type == type && row.left(leftType) && row.right(rightType)) {
+      return row.work(a, b, context);
+    }
+  }
+  return Value();
+}
+
+Value XQueryOperatorExpr::arithmeticOperatorEvaluate(int type, const Value& withLeft,
+                                                     const Value& right,
+                                                     XQueryContext& forContext) {
+  if (Value answer = XQueryArithmeticShortcut(type, withLeft.get(), right.get())) return answer;
+  return XQueryArithmeticPlainly(type, withLeft, right, forContext);
+}
+
+Value XQueryUnarySignPlainly(int type, const Value& operand, XQueryContext& context) {
+  Value number = normalised(operand);
+  if (!number) return Value();
+  if (isNull(number)) return NSNull::null();
+  if (isa<NSArray>(number)) return Value();
+  number = asNumberIfUntyped(number, XQueryTypeDouble, context);
+  const XQueryTypeID numberType = XQueryObjectTypeID(number.get());
+  if (!XQueryIsNumericTypeID(numberType)) return Value();
+  const NumericWork& work = type == XQueryOperatorMinus ? subtraction : addition;
+  // The zero is not asked to be of the type: some derived integer types have none.
+  const Value result = compute(work, *XQueryNumber::zero(), numberIn(number), numberType);
+  return XQueryCastAsTypeForContext(result, numberType, context);
+}
+
+Value XQueryUnarySign(int type, const Value& operand, XQueryContext& context) {
+  // Where the shortcut applies, adding to an integer leaves every operand in its own type.
+  static const Ref<XQueryNumber> zero = [] {
+    Ref<XQueryNumber> integer = XQueryNumber::integerWithInt64(0);
+    integer->makeImmortal();
+    return integer;
+  }();
+  if (Value answer = XQueryArithmeticShortcut(type, zero.get(), operand.get())) return answer;
+  return XQueryUnarySignPlainly(type, operand, context);
+}
+
+}  // namespace xquery

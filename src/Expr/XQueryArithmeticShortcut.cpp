@@ -1,0 +1,174 @@
+// Arithmetic over the commonest operands without casts and without values in between.
+//
+// Three cases, each equal to the plain algorithm for the reason given; everything else, and every
+// case that ends in an error, is left to the plain algorithm:
+//
+//   integer, decimal   Both operands are exactly xs:integer or xs:decimal and hold a decimal.
+//                      Casting them to their common type keeps their value, and casting the result
+//                      back to it keeps the result, so the decimals can be computed with directly.
+//   small integers     The same with both values in a machine word and no overflow, where machine
+//                      arithmetic is exact.
+//   double             One operand is exactly xs:double, or untyped with a number for a text, and
+//                      the other one of these or exactly xs:integer or xs:decimal. The common type
+//                      is xs:double; an untyped operand is cast by scanning its text, and an exact
+//                      one by scanning what it prints.
+#include "Expr/XQueryArithmetic.h"
+#include "Expr/XQueryOperatorExpr.h"
+#include "Expr/XQueryUntypedText.h"
+#include "Types/XQueryNumber.h"
+
+#include <cmath>
+#include <cstdint>
+#include <limits>
+
+namespace xquery {
+namespace {
+
+// --- small integers ------------------------------------------------------------------------------
+
+Value smallIntegerAnswer(int type, int64_t a, int64_t b) {
+  int64_t result = 0;
+  switch (type) {
+    case XQueryOperatorPlus:
+      if (__builtin_add_overflow(a, b, &result)) return Value();
+      break;
+    case XQueryOperatorMinus:
+      if (__builtin_sub_overflow(a, b, &result)) return Value();
+      break;
+    case XQueryOperatorMultiply:
+      if (__builtin_mul_overflow(a, b, &result)) return Value();
+      break;
+    case XQueryOperatorIDiv:
+    case XQueryOperatorMod:
+      // Dividing by -1 is left out: the smallest integer has no counterpart.
+      if (b == 0 || b == -1) return Value();
+      result = type == XQueryOperatorIDiv ? a / b : a % b;
+      break;
+    case XQueryOperatorDiv:
+      if (b == 0 || b == -1 || a % b != 0) return Value();
+      return XQueryNumber::numberWithDecimal(NSDecimal(a / b));
+    default:
+      return Value();
+  }
+  return XQueryNumber::integerWithInt64(result);
+}
+
+// --- decimals of any size ------------------------------------------------------------------------
+
+Value exactAnswer(int type, const NSDecimal& a, const NSDecimal& b, bool bothIntegers) {
+  const auto inCommonType = [bothIntegers](NSDecimal value) -> Value {
+    return bothIntegers ? XQueryNumber::integerWithDecimal(std::move(value))
+                        : XQueryNumber::numberWithDecimal(std::move(value));
+  };
+  switch (type) {
+    case XQueryOperatorPlus:
+      return inCommonType(a.add(b));
+    case XQueryOperatorMinus:
+      return inCommonType(a.subtract(b));
+    case XQueryOperatorMultiply:
+      return inCommonType(a.multiply(b));
+    default:
+      break;
+  }
+  if (b.isZero()) return Value();
+  switch (type) {
+    case XQueryOperatorDiv:
+      return XQueryNumber::numberWithDecimal(a.divide(b));
+    case XQueryOperatorIDiv:
+      return XQueryNumber::integerWithDecimal(a.integerDivide(b));
+    case XQueryOperatorMod:
+      return inCommonType(a.remainder(b));
+    default:
+      return Value();
+  }
+}
+
+// --- doubles -------------------------------------------------------------------------------------
+
+// Every integer up to this magnitude is a double.
+constexpr int64_t exactIntegerBound = int64_t{1} << std::numeric_limits<double>::digits;
+
+Value doubleAnswer(int type, double a, double b) {
+  switch (type) {
+    case XQueryOperatorPlus:
+      return XQueryNumber::numberWithDouble(a + b);
+    case XQueryOperatorMinus:
+      return XQueryNumber::numberWithDouble(a - b);
+    case XQueryOperatorMultiply:
+      return XQueryNumber::numberWithDouble(a * b);
+    case XQueryOperatorDiv:
+      return XQueryNumber::numberWithDouble(XQueryQuotient(a, b));
+    case XQueryOperatorMod:
+      return XQueryNumber::numberWithDouble(std::fmod(a, b));
+    case XQueryOperatorIDiv: {
+      if (b == 0) return Value();
+      const double quotient = std::trunc(a / b);
+      if (!(std::fabs(quotient) < static_cast<double>(exactIntegerBound))) return Value();
+      return XQueryNumber::integerWithInt64(static_cast<int64_t>(quotient));
+    }
+    default:
+      return Value();
+  }
+}
+
+// What an operand is to the shortcut.
+struct Operand {
+  enum Form : uint8_t { Other, Exact, Double };
+  Form form = Other;
+  bool isInteger = false;            // of an exact operand
+  const NSDecimal* exact = nullptr;  // of an exact operand
+  double number = 0;                 // of a double operand
+};
+
+Operand operandOf(const NSObject* object, int type) {
+  Operand operand;
+  if (const auto* number = dyn_cast<XQueryNumber>(object)) {
+    const XQueryTypeID typeID = number->typeID();
+    if (typeID == XQueryTypeDouble) {
+      operand.form = Operand::Double;
+      operand.number = number->doubleValue();
+    } else if (typeID == XQueryTypeInteger || typeID == XQueryTypeDecimal) {
+      operand.exact = number->storedDecimal();
+      operand.isInteger = typeID == XQueryTypeInteger;
+      if (operand.exact && !operand.exact->isNaN()) operand.form = Operand::Exact;
+    }
+    return operand;
+  }
+  // For idiv an untyped operand is an integer, which is not what a scanned double tells.
+  if (type == XQueryOperatorIDiv || !XQueryIsUntyped(object)) return operand;
+  const XQueryUntypedText text(*object);
+  if (scanDouble(text.view(), operand.number)) operand.form = Operand::Double;
+  return operand;
+}
+
+double asDouble(const Operand& operand) {
+  if (operand.form == Operand::Double) return operand.number;
+  const NSDecimal& exact = *operand.exact;
+  if (exact.isSmallInteger() && exact.smallInteger() >= -exactIntegerBound &&
+      exact.smallInteger() <= exactIntegerBound) {
+    return static_cast<double>(exact.smallInteger());
+  }
+  double number = 0;
+  scanDouble(NSStringView::ascii(exact.toString()), number);
+  return number;
+}
+
+}  // namespace
+
+Value XQueryArithmeticShortcut(int type, const NSObject* left, const NSObject* right) {
+  const Operand a = operandOf(left, type);
+  if (a.form == Operand::Other) return Value();
+  const Operand b = operandOf(right, type);
+  if (b.form == Operand::Other) return Value();
+  if (a.form == Operand::Double || b.form == Operand::Double) {
+    return doubleAnswer(type, asDouble(a), asDouble(b));
+  }
+  const bool bothIntegers = a.isInteger && b.isInteger;
+  if (bothIntegers && a.exact->isSmallInteger() && b.exact->isSmallInteger()) {
+    Value answer = smallIntegerAnswer(type, a.exact->smallInteger(), b.exact->smallInteger());
+    if (answer) return answer;
+  }
+  return exactAnswer(type, *a.exact, *b.exact, bothIntegers);
+}
+
+}  // namespace xquery

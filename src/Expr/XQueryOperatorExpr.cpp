@@ -1,0 +1,209 @@
+#include "Expr/XQueryOperatorExpr.h"
+
+#include "Eval/StackGuard.h"
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryArithmetic.h"
+#include "Expr/XQueryLeaves.h"
+#include "Types/XQueryAtomization.h"
+#include "xquery/Collection.h"
+#include "xquery/Error.h"
+
+#include <array>
+#include <cstddef>
+#include <string_view>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+constexpr std::string_view invalidType = "invalid type for operator";
+
+enum OperatorClass : int {
+  NoClass = 0,
+  Logical = 1,
+  Arithmetic = 2,
+  Range = 3,
+  Sequence = 4,
+  ValueComparison = 5,
+  GeneralComparison = 6,
+  NodeComparison = 7,
+};
+
+constexpr int firstCode = XQueryOperatorOr;
+constexpr int lastCode = XQueryOperatorAfter;
+
+// Indexed by operator code.
+constexpr std::array<OperatorClass, lastCode + 1> classes = {
+    NoClass,
+    Logical,            // or
+    Logical,            // and
+    Arithmetic,         // +
+    Arithmetic,         // -
+    Arithmetic,         // *
+    Arithmetic,         // div
+    Arithmetic,         // idiv
+    Arithmetic,         // mod
+    Sequence,           // union
+    Sequence,           // intersect
+    Sequence,           // except
+    Range,              // to
+    GeneralComparison,  // =
+    GeneralComparison,  // !=
+    GeneralComparison,  // <
+    GeneralComparison,  // <=
+    GeneralComparison,  // >
+    GeneralComparison,  // >=
+    ValueComparison,    // eq
+    ValueComparison,    // ne
+    ValueComparison,    // lt
+    ValueComparison,    // le
+    ValueComparison,    // gt
+    ValueComparison,    // ge
+    NodeComparison,     // is
+    NodeComparison,     // <<
+    NodeComparison,     // >>
+};
+
+using Evaluate = Value (*)(int, const Value&, const Value&, XQueryContext&);
+
+// Indexed by operator class.
+constexpr std::array<Evaluate, NodeComparison + 1> evaluators = {
+    nullptr,
+    XQueryOperatorExpr::logicalOperatorEvaluate,
+    XQueryOperatorExpr::arithmeticOperatorEvaluate,
+    XQueryOperatorExpr::rangeOperatorEvaluate,
+    XQueryOperatorExpr::sequenceOperatorEvaluate,
+    XQueryOperatorExpr::valueComparisonOperatorEvaluate,
+    XQueryOperatorExpr::generalComparisonOperatorEvaluate,
+    XQueryOperatorExpr::nodeComparisonOperatorEvaluate,
+};
+
+Value dispatch(int type, const Value& left, const Value& right, XQueryContext& context) {
+  const Evaluate evaluate = evaluators[XQueryOperatorExpr::operatorClassification(type)];
+  return evaluate ? evaluate(type, left, right, context) : Value();
+}
+
+// Invalid operands (null) and an error record become an error of the expression at `line`; a
+// negative line is none.
+[[noreturn]] void raiseFailure(const Value& answer, int64_t line, XQueryContext& context) {
+  const auto* record = dyn_cast<XQueryError>(answer.get());
+  const int64_t number = record ? record->err() : 6;
+  const Ref<NSString> message = record ? record->msg() : NSString::stringWithASCII(invalidType);
+  context._internal().raise(line < 0 ? XQueryError::error(number, message)
+                                     : XQueryError::error(number, message, line));
+}
+
+bool isFailure(const Value& answer) {
+  return !answer || answer->kind() == Kind::QueryError;
+}
+
+// The operators along the left side of a chain such as "1 + 2 + 3", outermost first. Walking them
+// in a loop makes the length of a chain a matter of memory, not of stack.
+template <class Node>
+class LeftSpine {
+ public:
+  explicit LeftSpine(Node* top) {
+    for (Node* node = top; node; node = dyn_cast<XQueryOperatorExpr>(node->left())) push(node);
+  }
+  size_t count() const { return _count; }
+  // 0 is the outermost.
+  Node* operator[](size_t index) const {
+    return index < inlineCount ? _inline[index] : _rest[index - inlineCount];
+  }
+
+ private:
+  // Chains longer than this are rare enough to pay for a vector.
+  static constexpr size_t inlineCount = 8;
+
+  void push(Node* node) {
+    if (_count < inlineCount) {
+      _inline[_count] = node;
+    } else {
+      _rest.push_back(node);
+    }
+    ++_count;
+  }
+
+  std::array<Node*, inlineCount> _inline;
+  std::vector<Node*> _rest;
+  size_t _count = 0;
+};
+
+Ref<XQueryExpr> presentOrEmpty(Ref<XQueryExpr> operand) {
+  if (operand) return operand;
+  return XQueryLiteral::literalWithValue(NSNull::null());
+}
+
+}  // namespace
+
+Ref<XQueryOperatorExpr> XQueryOperatorExpr::operatorExpr(int type, Ref<XQueryExpr> withRightExpr) {
+  return make<XQueryOperatorExpr>(type, presentOrEmpty(std::move(withRightExpr)));
+}
+
+void XQueryOperatorExpr::setLeftExpr(Ref<XQueryExpr> left) {
+  _left = presentOrEmpty(std::move(left));
+}
+
+void XQueryOperatorExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  if (!XQueryCheckStack(prolog)) return;
+  const LeftSpine<XQueryOperatorExpr> spine(this);
+  XQueryExpr* innermost = spine[spine.count() - 1]->left();
+  if (innermost) innermost->bindInfoForProlog(prolog);
+  for (size_t index = spine.count(); index-- > 0;) {
+    spine[index]->_right->bindInfoForProlog(prolog);
+  }
+}
+
+Value XQueryOperatorExpr::evaluateWithContext(XQueryContext& context) const {
+  XQueryCheckStack(context);
+  if (!isa<XQueryOperatorExpr>(_left.get())) {
+    return evaluateWithLeftValue(_left ? _left->evaluateWithContext(context) : Value(), context);
+  }
+  const LeftSpine<const XQueryOperatorExpr> spine(this);
+  Value value;
+  if (const XQueryExpr* innermost = spine[spine.count() - 1]->left()) {
+    value = innermost->evaluateWithContext(context);
+  }
+  for (size_t index = spine.count(); index-- > 0;) {
+    value = spine[index]->evaluateWithLeftValue(value, context);
+  }
+  return value;
+}
+
+Value XQueryOperatorExpr::evaluateWithLeftValue(const Value& left, XQueryContext& context) const {
+  if (_type == XQueryOperatorOr || _type == XQueryOperatorAnd) {
+    const bool isTrue = XQueryIsTrue(XQueryEffectiveBooleanValue(leftOrEmpty(left), context));
+    if (isTrue == (_type == XQueryOperatorOr)) return NSNumber::numberWithBool(isTrue);
+    return XQueryEffectiveBooleanValue(_right->evaluateWithContext(context), context);
+  }
+  const Value right = _right->evaluateWithContext(context);
+  Value answer = isSign() ? XQueryUnarySign(_type, right, context)
+                          : dispatch(_type, leftOrEmpty(left), right, context);
+  if (isFailure(answer)) raiseFailure(answer, _line, context);
+  return answer;
+}
+
+// A left operand that was never set is the empty sequence for every operator but the signs.
+Value XQueryOperatorExpr::leftOrEmpty(const Value& left) const {
+  return _left ? left : Value(NSNull::null());
+}
+
+int XQueryOperatorExpr::operatorClassification(int type) {
+  return type < firstCode || type > lastCode ? NoClass : classes[static_cast<size_t>(type)];
+}
+
+Value XQueryOperatorExpr::evaluateOperator(int type, const Value& withLeft, const Value& right,
+                                           XQueryContext& forContext) {
+  Value answer = dispatch(type, withLeft, right, forContext);
+  if (isFailure(answer)) raiseFailure(answer, -1, forContext);
+  return answer;
+}
+
+Value XQueryOperatorExpr::logicalOperatorEvaluate(int type, const Value& withLeft,
+                                                  const Value& right, XQueryContext& forContext) {
+  const bool isTrue = XQueryIsTrue(XQueryEffectiveBooleanValue(withLeft, forContext));
+  if (isTrue == (type == XQueryOperatorOr)) return NSNumber::numberWithBool(isTrue);
+  return XQueryEffectiveBooleanValue(right, forContext);
+}
+
+}  // namespace xquery
