@@ -33,6 +33,7 @@ class Parse {
   void guarded(Function function);
   void fail(const char* message);
   void failAt(const char* message, int64_t line, int64_t column);
+  void note(const char* message, int64_t line, int64_t column);  // the first failure counts
   bool hasReadAll();
   bool mayExpand(size_t bytes);
   // Comments and instructions of the internal subset are no nodes of the document.
@@ -70,6 +71,8 @@ class Parse {
   bool _failed = false;
 };
 
+constexpr const char* outOfMemory = "out of memory";
+
 std::string_view viewOf(const xmlChar* text, size_t length) {
   return {reinterpret_cast<const char*>(text), length};
 }
@@ -80,15 +83,19 @@ std::string_view viewOf(const xmlChar* text) {
 
 // --- failures --------------------------------------------------------------------------------
 
+void Parse::note(const char* message, int64_t line, int64_t column) {
+  if (_failed) return;
+  _failed = true;
+  std::string_view text = message ? message : "not well formed";
+  while (!text.empty() && (text.back() == '\n' || text.back() == ' ')) text.remove_suffix(1);
+  _error.message = text;
+  std::replace(_error.message.begin(), _error.message.end(), '\n', ' ');
+  _error.line = line;
+  _error.column = column;
+}
+
 void Parse::failAt(const char* message, int64_t line, int64_t column) {
-  if (!_failed) {
-    _failed = true;
-    std::string_view text = message ? message : "not well formed";
-    while (!text.empty() && (text.back() == '\n' || text.back() == ' ')) text.remove_suffix(1);
-    _error.message = text;
-    _error.line = line;
-    _error.column = column;
-  }
+  note(message, line, column);
   xmlStopParser(_parser);
 }
 
@@ -105,7 +112,7 @@ void Parse::guarded(Function function) {
   } catch (const LibXMLStop& stop) {
     fail(stop.message);
   } catch (const std::bad_alloc&) {
-    fail("out of memory");
+    fail(outOfMemory);
   }
 }
 
@@ -118,14 +125,19 @@ void Parse::hearError(void* self, xmlError* error) {
 
 // --- input -----------------------------------------------------------------------------------
 
+// The parser cannot be stopped here, since stopping frees the buffer that is being filled; after a
+// failure it sees the end of the input.
 int Parse::readInput(void* self, char* buffer, int size) {
   Parse& parse = of(self);
   if (parse._failed || parse._reachedEnd) return 0;
   ptrdiff_t count = -1;
-  parse.guarded([&] { count = parse._read(buffer, static_cast<size_t>(size)); });
-  if (parse._failed) return 0;
+  try {
+    count = parse._read(buffer, static_cast<size_t>(size));
+  } catch (const std::bad_alloc&) {
+    parse.note(outOfMemory, 0, 0);
+  }
   if (count < 0) {
-    parse.failAt("the input cannot be read", 0, 0);
+    parse.note("the input cannot be read", 0, 0);
     return 0;
   }
   if (count == 0) parse._reachedEnd = true;

@@ -6,6 +6,7 @@
 // it. Hashes start from a random seed: whoever writes a document cannot choose names that collide.
 #include "Platform/XMLNames.h"
 
+#include <algorithm>
 #include <array>
 #include <cstdlib>
 #include <mutex>
@@ -257,6 +258,10 @@ const NSXMLName* NSXMLInternName(NSStringView qualifiedName, NSStringView URI) {
       });
 }
 
+void NSXMLRetainName(const NSXMLName* name) {
+  InternTable<NSXMLName, NameKey>::retain(counted(name));
+}
+
 void NSXMLRetainName(const NSXMLExpandedName* name) {
   InternTable<NSXMLExpandedName, ExpandedKey>::retain(counted(name));
 }
@@ -276,6 +281,44 @@ void NSXMLReleaseName(const NSXMLName* name) {
 size_t NSXMLInternedNameCount() {
   return tables().URIs.count() + tables().expandedNames.count() + tables().names.count();
 }
+
+// --- sets of names ---------------------------------------------------------------------------
+
+// The name's own place, or the empty one where it belongs.
+size_t NSXMLNameSet::placeOf(const NSXMLName* name) const {
+  const size_t mask = _places.size() - 1;
+  size_t place = name->hash & mask;
+  while (_places[place] && _places[place] != name) place = (place + 1) & mask;
+  return place;
+}
+
+bool NSXMLNameSet::contains(const NSXMLName* name) const {
+  if (!isList()) return _places[placeOf(name)] != nullptr;
+  return std::find(_places.begin(), _places.end(), name) != _places.end();
+}
+
+bool NSXMLNameSet::insert(const NSXMLName* name) {
+  if (contains(name)) return false;
+  if (_count < longestList) {
+    _places.push_back(name);
+    ++_count;
+    return true;
+  }
+  if (_count == longestList || (_count + 1) * 2 > _places.size()) grow();
+  _places[placeOf(name)] = name;
+  ++_count;
+  return true;
+}
+
+void NSXMLNameSet::grow() {
+  std::vector<const NSXMLName*> old(isList() ? longestList * 4 : _places.size() * 2);
+  old.swap(_places);
+  for (const NSXMLName* name : old) {
+    if (name) _places[placeOf(name)] = name;
+  }
+}
+
+// --- handles ---------------------------------------------------------------------------------
 
 NSXMLExpandedNameRef::NSXMLExpandedNameRef(NSStringView URI, NSStringView localName)
     : _name(NSXMLInternExpandedName(localName, URI)) {}

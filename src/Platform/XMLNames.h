@@ -7,6 +7,8 @@
 
 #include "xquery/XMLNode.h"
 
+#include <vector>
+
 namespace xquery {
 
 // A namespace URI is shared by the expanded names in it, since a document may put very many names
@@ -31,9 +33,35 @@ inline NSStringView NSXMLPrefixOf(const NSXMLName& name) {
 const NSXMLName* NSXMLInternName(NSStringView qualifiedName, NSStringView URI);
 const NSXMLExpandedName* NSXMLInternExpandedName(NSStringView localName, NSStringView URI);
 
+void NSXMLRetainName(const NSXMLName* name);
 void NSXMLRetainName(const NSXMLExpandedName* name);
 void NSXMLReleaseName(const NSXMLName* name);
 void NSXMLReleaseName(const NSXMLExpandedName* name);
+
+// A set of names, as a tree keeps it; the counts are the user's affair. Few names are a list that
+// is searched, more are a table of 2^n places at most half full.
+class NSXMLNameSet {
+ public:
+  size_t count() const { return _count; }
+  bool contains(const NSXMLName* name) const;
+  // Whether it was not there yet.
+  bool insert(const NSXMLName* name);
+  template <class Function>
+  void forEach(Function function) const {
+    for (const NSXMLName* name : _places) {
+      if (name) function(name);
+    }
+  }
+
+ private:
+  static constexpr size_t longestList = 8;
+  bool isList() const { return _count <= longestList; }
+  size_t placeOf(const NSXMLName* name) const;
+  void grow();
+
+  std::vector<const NSXMLName*> _places;
+  size_t _count = 0;
+};
 
 // How many names and URIs are alive in the process.
 size_t NSXMLInternedNameCount();

@@ -23,18 +23,10 @@ bool isTextOf(const NSXMLNode* node) {
   return node->kind() == Kind::Text;
 }
 
-// The first text node from `node` on, within the subtree of `root`.
+// The first text node from `node` on that comes before `end`.
 const NSXMLNode* textFrom(const NSXMLNode* node, const NSXMLNode* end) {
   while (node != end && !isTextOf(node)) node = node->nextNode();
   return node == end ? nullptr : node;
-}
-
-// The node after the whole subtree of `root`.
-const NSXMLNode* endOfSubtree(const NSXMLNode* root) {
-  for (const NSXMLNode* node = root; node; node = node->parent()) {
-    if (const NSXMLNode* next = node->nextSibling()) return next;
-  }
-  return nullptr;
 }
 
 }  // namespace
@@ -144,7 +136,7 @@ NSStringView NSXMLNode::textView() const {
 
 Ref<NSString> NSXMLNode::stringValue() const {
   if (!isBranch()) return NSString::stringInTreeOf(this, textView());
-  const NSXMLNode* end = endOfSubtree(this);
+  const NSXMLNode* end = NSXMLTree::endOfSubtree(this);
   const NSXMLNode* first = textFrom(this, end);
   if (!first) return NSString::empty();
   if (!textFrom(first->nextNode(), end)) return NSString::stringInTreeOf(first, first->textView());
@@ -158,7 +150,7 @@ void NSXMLNode::appendStringValueTo(NSMutableString& out) const {
     out.append(textView());
     return;
   }
-  const NSXMLNode* end = endOfSubtree(this);
+  const NSXMLNode* end = NSXMLTree::endOfSubtree(this);
   for (const NSXMLNode* text = textFrom(this, end); text; text = textFrom(text->nextNode(), end)) {
     out.append(text->textView());
   }

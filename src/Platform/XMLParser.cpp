@@ -146,7 +146,8 @@ class NameCache {
 class TreeHandler final : public LibXMLHandler {
  public:
   TreeHandler(uint32_t options, size_t expectedBytes)
-      : _keepsWhitespace((options & NSXMLNodePreserveWhitespace) != 0),
+      : _alwaysKeepsWhitespace((options & NSXMLNodePreserveWhitespace) != 0),
+        _keepsWhitespace(_alwaysKeepsWhitespace),
         _keepsCDATA((options & NSXMLNodePreserveCDATA) != 0),
         _builder(std::max(expectedBytes, size_t{256}), std::max(expectedBytes / 2, size_t{128})),
         _names(_builder.tree()) {
@@ -176,7 +177,8 @@ class TreeHandler final : public LibXMLHandler {
   void setText(NSXMLNode* node, std::string_view text);
   void hearSpace(const LibXMLName& name, std::string_view value);
 
-  bool _keepsWhitespace;
+  bool _alwaysKeepsWhitespace;
+  bool _keepsWhitespace;  // at this place
   bool _keepsCDATA;
   NSXMLTreeBuilder _builder;
   NameCache _names;
@@ -232,7 +234,8 @@ void TreeHandler::hearSpace(const LibXMLName& name, std::string_view value) {
     return;
   }
   if (value != "preserve" && value != "default") return;
-  const bool keeps = value == "preserve";
+  // The option to preserve is not overruled by a document.
+  const bool keeps = value == "preserve" || _alwaysKeepsWhitespace;
   if (keeps == _keepsWhitespace) return;
   _spaceChanges.push_back({_builder.current(), _keepsWhitespace});
   _keepsWhitespace = keeps;

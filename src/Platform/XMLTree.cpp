@@ -85,8 +85,8 @@ struct NSXMLTreeExtra {
   size_t nextNodeBlock = 0;
   size_t nextTextBlock = 0;
 
-  std::unordered_set<const NSXMLName*> names;  // one count each
-  std::vector<NSXMLDocument*> documents;       // those with a URI
+  NSXMLNameSet names;                     // one count each
+  std::vector<NSXMLDocument*> documents;  // those with a URI
 };
 
 NSXMLTreeExtra* NSXMLTree::extra() const {
@@ -106,7 +106,7 @@ void NSXMLTree::forEachName(Function function) const {
   if (_extra & 1) {
     function(reinterpret_cast<const NSXMLName*>(_extra & ~uintptr_t{1}));
   } else if (const NSXMLTreeExtra* present = extra()) {
-    for (const NSXMLName* name : present->names) function(name);
+    present->names.forEach(function);
   }
 }
 
@@ -114,9 +114,17 @@ void NSXMLTree::adopt(const NSXMLName* name) {
   const uintptr_t single = reinterpret_cast<uintptr_t>(name) | 1;
   if (_extra == 0) {
     _extra = single;
-  } else if (_extra == single || !makeExtra().names.insert(name).second) {
+  } else if (_extra == single || !makeExtra().names.insert(name)) {
     NSXMLReleaseName(name);
   }
+}
+
+void NSXMLTree::use(const NSXMLName* name) {
+  const NSXMLTreeExtra* present = extra();
+  if (_extra == (reinterpret_cast<uintptr_t>(name) | 1)) return;
+  if (present && present->names.contains(name)) return;
+  NSXMLRetainName(name);
+  adopt(name);
 }
 
 // --- life ------------------------------------------------------------------------------------
@@ -217,7 +225,17 @@ void NSXMLTree::startBulk(size_t nodeBytes, size_t textBytes) {
 }
 
 void NSXMLTree::endBulk() {
-  if (NSXMLTreeExtra* state = extra()) state->isBulk = false;
+  const NSXMLTreeExtra* state = extra();
+  if (!state) return;
+  if (state->names.count() > 1 || !state->documents.empty()) {
+    extra()->isBulk = false;
+    return;
+  }
+  // A small tree needs no extra part any more.
+  const std::unique_ptr<NSXMLTreeExtra> owned(extra());
+  _extra = 0;
+  owned->names.forEach(
+      [this](const NSXMLName* name) { _extra = reinterpret_cast<uintptr_t>(name) | 1; });
 }
 
 void* NSXMLTree::allocateBulkNode(size_t bytes, uint16_t& distance) {
@@ -378,7 +396,7 @@ void NSXMLTree::absorbExtra(NSXMLTree* smaller) {
   // The larger set of names takes in the smaller one.
   const NSXMLTreeExtra* theirs = smaller->extra();
   const NSXMLTreeExtra* ours = extra();
-  if (theirs && (!ours || theirs->names.size() > ours->names.size())) {
+  if (theirs && (!ours || theirs->names.count() > ours->names.count())) {
     std::swap(_extra, smaller->_extra);
   }
   smaller->forEachName([this](const NSXMLName* name) { adopt(name); });

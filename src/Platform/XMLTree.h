@@ -20,7 +20,6 @@
 
 #include <cstddef>
 #include <memory>
-#include <unordered_set>
 #include <vector>
 
 namespace xquery {
@@ -56,7 +55,7 @@ class NSXMLTree : public NSXMLTreeHead {
   // --- nodes: without parent, order number 0 ---------------------------------------------------
   // From now on nodes and texts come from large blocks, the first with room for that many bytes.
   void startBulk(size_t nodeBytes, size_t textBytes);
-  // Gives the rest of the newest blocks back.
+  // What is left of the newest blocks stays unused.
   void endBulk();
   // All kinds but elements and documents.
   NSXMLNode* makeNode(Kind kind);
@@ -82,10 +81,16 @@ class NSXMLTree : public NSXMLTreeHead {
   }
   // The tree takes over the caller's count of the name.
   void adopt(const NSXMLName* name);
+  // Counts the name for this tree unless it is counted already.
+  void use(const NSXMLName* name);
   // Copies the text into the arena, in 8-bit form if it fits it.
   void setText(NSXMLNode* node, NSStringView text);
-  // Room for that many bytes of text, aligned for UTF-16.
+  // Room for that many bytes of text, at an even address for the sake of UTF-16.
   void* allocateText(size_t bytes);
+  // What a text takes of a bulk text block.
+  static size_t roomForText(NSStringView text) {
+    return text.isWide() ? size_t{text.length()} * 2 : (size_t{text.length()} + 1) & ~size_t{1};
+  }
   // For a text that is in the arena.
   static void setStoredText(NSXMLNode* node, NSStringView text);
   void setURI(NSXMLDocument* document, const NSString* URI);  // null for none
@@ -107,6 +112,15 @@ class NSXMLTree : public NSXMLTreeHead {
   static NSXMLNode*& firstPropertyOf(NSXMLElement* element) { return element->_firstProperty; }
   static NSXMLNode* firstPropertyOf(const NSXMLElement* element) { return element->_firstProperty; }
   static NSXMLNode* nextProperty(const NSXMLNode* property) { return property->_next; }
+  static bool mayHaveChildren(const NSXMLNode* node) { return node->isBranch(); }
+  // The node after the whole subtree of `root`; null at the end of the tree.
+  static const NSXMLNode* endOfSubtree(const NSXMLNode* root) {
+    if (root->isProperty()) return nullptr;
+    for (const NSXMLNode* node = root; node; node = node->_parent) {
+      if (node->_next) return node->_next;
+    }
+    return nullptr;
+  }
   static void setOrderNumber(NSXMLNode* node, uint32_t number) { node->_word = number; }
   static void setCDATA(NSXMLNode* node) { node->_flags |= NSXMLNode::CDATA; }
   static bool isCDATA(const NSXMLNode* node) { return (node->_flags & NSXMLNode::CDATA) != 0; }

@@ -1,6 +1,7 @@
 // The structure of trees, document order, merging. What is computed lazily or by counting is
 // checked against a plain walk over generated trees.
 #include "Platform/XMLNames.h"
+#include "Platform/XMLTestSupport.h"
 #include "Platform/XMLTree.h"
 #include "xquery/XMLNode.h"
 
@@ -14,17 +15,6 @@
 
 namespace xquery {
 namespace {
-
-NSStringView A(std::string_view text) {
-  return NSStringView::ascii(text);
-}
-
-Ref<NSXMLDocument> parsed(std::string_view text, uint32_t options = NSXMLNodePreserveWhitespace) {
-  NSXMLParseError error;
-  Ref<NSXMLDocument> document = NSXMLDocument::documentWithData(text, options, &error);
-  EXPECT_TRUE(document) << error.message << " at " << error.line << ":" << error.column;
-  return document;
-}
 
 Ref<NSXMLElement> element(std::string_view name) {
   return NSXMLElement::elementWithName(A(name));

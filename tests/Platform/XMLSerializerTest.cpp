@@ -1,0 +1,221 @@
+#include "Platform/XMLTestSupport.h"
+#include "xquery/XMLNode.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+namespace xquery {
+namespace {
+
+constexpr uint32_t keepAll = NSXMLNodePreserveWhitespace | NSXMLNodePreserveCDATA;
+
+std::string written(const NSXMLNode* node) {
+  std::string out;
+  node->appendXMLTo(out);
+  return out;
+}
+
+std::string rewritten(std::string_view text) {
+  return written(parsed(text, keepAll)->rootElement());
+}
+
+NSStringView wide(std::u16string_view text) {
+  return {text.data(), static_cast<uint32_t>(text.size())};
+}
+
+TEST(XMLSerializer, WhatIsWrittenPlainlyIsWrittenBackTheSame) {
+  for (const char* text : {
+           "<a/>",
+           "<a>text</a>",
+           "<a x=\"1\" y=\"\"><b/> <b></b></a>",
+           "<a xmlns=\"u\" xmlns:p=\"v\"><p:b p:x=\"1\"/></a>",
+           "<p:a xmlns:p=\"u\"><b/><p:c xmlns:p=\"v\"/><p:d xmlns:p=\"u\"/></p:a>",
+           "<a xmlns=\"u\"><b xmlns=\"\"><c xmlns=\"u\"/></b></a>",
+           "<a><!--c--><?p?><?p q r?></a>",
+           "<a>&amp;&lt;&gt;\"'</a>",
+           "<a>x&#xD;\ny</a>",
+           "<a x=\"&amp;&lt;>&quot;'&#x9;&#xA;&#xD; \"/>",
+           "<a><![CDATA[<x> & ]]></a>",
+           "<a xml:lang=\"en\" xml:space=\"preserve\"> </a>",
+           "<\xC3\xA9 \xC3\xA9=\"\xE2\x82\xAC\">\xF0\x9F\x98\x80&lt;</\xC3\xA9>",
+       }) {
+    std::string expected = text;
+    if (const size_t at = expected.find("<b></b>"); at != std::string::npos) {
+      expected.replace(at, 7, "<b/>");
+    }
+    EXPECT_EQ(rewritten(text), expected);
+  }
+}
+
+TEST(XMLSerializer, OnlyADocumentHasADeclaration) {
+  const auto document = parsed("<!--x--><a/><?p?>");
+  EXPECT_EQ(document->XMLString()->utf8(),
+            "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<!--x--><a/><?p?>");
+  EXPECT_EQ(document->rootElement()->XMLString()->utf8(), "<a/>");
+}
+
+TEST(XMLSerializer, LeavesAreWrittenAlone) {
+  EXPECT_EQ(written(NSXMLNode::attributeWithName(A("p:x"), A("a\"<b"), A("u")).get()),
+            "p:x=\"a&quot;&lt;b\"");
+  EXPECT_EQ(written(NSXMLNode::namespaceWithName(A("p"), A("u")).get()), "xmlns:p=\"u\"");
+  EXPECT_EQ(written(NSXMLNode::namespaceWithName({}, A("u")).get()), "xmlns=\"u\"");
+  EXPECT_EQ(written(NSXMLNode::textWithStringValue(A("a<b>&")).get()), "a&lt;b&gt;&amp;");
+  EXPECT_EQ(written(NSXMLNode::cdataWithStringValue(A("a<b")).get()), "<![CDATA[a<b]]>");
+  EXPECT_EQ(written(NSXMLNode::commentWithStringValue(A("c")).get()), "<!--c-->");
+  EXPECT_EQ(written(NSXMLNode::processingInstructionWithName(A("p"), A("")).get()), "<?p?>");
+}
+
+TEST(XMLSerializer, WhatWouldEndEarlyIsSeparated) {
+  EXPECT_EQ(written(NSXMLNode::commentWithStringValue(A("a--b---")).get()), "<!--a- -b- - - -->");
+  EXPECT_EQ(written(NSXMLNode::processingInstructionWithName(A("p"), A("a?>b")).get()),
+            "<?p a? >b?>");
+  EXPECT_EQ(written(NSXMLNode::cdataWithStringValue(A("a]]>b")).get()),
+            "<![CDATA[a]]]]><![CDATA[>b]]>");
+  EXPECT_EQ(written(NSXMLNode::cdataWithStringValue(A("a\rb")).get()),
+            "<![CDATA[a]]>&#xD;<![CDATA[b]]>");
+}
+
+TEST(XMLSerializer, CharactersThatXMLCannotHoldAreReplaced) {
+  const std::string mark = "\xEF\xBF\xBD";
+  EXPECT_EQ(written(NSXMLNode::textWithStringValue(wide(u"a\xD800z\xDC00")).get()),
+            "a" + mark + "z" + mark);
+  EXPECT_EQ(written(NSXMLNode::textWithStringValue(A("a\x01"
+                                                     "b"))
+                        .get()),
+            "a" + mark + "b");
+  EXPECT_EQ(written(NSXMLNode::textWithStringValue(wide(u"\xFFFE\u00e9\x1F")).get()),
+            mark + "\xC3\xA9" + mark);
+  EXPECT_EQ(written(NSXMLNode::textWithStringValue(wide(u"\xD83D\xDE00")).get()),
+            "\xF0\x9F\x98\x80");
+}
+
+TEST(XMLSerializer, LongWideTextIsWrittenWhole) {
+  // Longer than a run, with pairs at every place where one might be cut.
+  for (size_t length = 8180; length < 8200; ++length) {
+    std::u16string text(length, u'\u00e9');
+    std::string expected;
+    for (size_t index = 0; index < length; ++index) expected += "\xC3\xA9";
+    for (int pair = 0; pair < 20; ++pair) {
+      text += u"\U0001F600";
+      expected += "\xF0\x9F\x98\x80";
+    }
+    ASSERT_EQ(written(NSXMLNode::textWithStringValue(wide(text)).get()), expected) << length;
+  }
+}
+
+// --- namespaces --------------------------------------------------------------------------------
+
+TEST(XMLSerializer, AFragmentDeclaresWhatItUsesOfTheDeclarationsAbove) {
+  const auto document = parsed(
+      "<a xmlns:p='up' xmlns:q='uq' xmlns:r='ur' xmlns='d'><b><p:c q:x='1'/></b><e xmlns=''/></a>");
+  const NSXMLNode* b = document->rootElement()->firstChild();
+  EXPECT_EQ(written(b), "<b xmlns:p=\"up\" xmlns:q=\"uq\" xmlns=\"d\"><p:c q:x=\"1\"/></b>");
+  EXPECT_EQ(written(b->firstChild()), "<p:c xmlns:p=\"up\" xmlns:q=\"uq\" q:x=\"1\"/>");
+  EXPECT_EQ(written(document->rootElement()->lastChild()), "<e xmlns=\"\"/>");
+}
+
+TEST(XMLSerializer, TheNearestDeclarationAboveCounts) {
+  const auto document = parsed("<a xmlns:p='1'><b xmlns:p='2'><c><p:d/></c></b></a>");
+  const NSXMLNode* c = document->rootElement()->firstChild()->firstChild();
+  EXPECT_EQ(written(c), "<c xmlns:p=\"2\"><p:d/></c>");
+}
+
+TEST(XMLSerializer, ConstructedNamesAreDeclared) {
+  const auto a = NSXMLElement::elementWithName(A("p:a"), A("u"));
+  EXPECT_TRUE(a->addAttribute(NSXMLNode::attributeWithName(A("q:x"), A("1"), A("v"))));
+  EXPECT_TRUE(a->addChild(NSXMLElement::elementWithName(A("p:b"), A("u"))));
+  EXPECT_TRUE(a->addChild(NSXMLElement::elementWithName(A("c"), A("w"))));
+  EXPECT_TRUE(a->addChild(NSXMLElement::elementWithName(A("d"))));
+  EXPECT_EQ(written(a.get()),
+            "<p:a xmlns:p=\"u\" xmlns:q=\"v\" q:x=\"1\"><p:b/><c xmlns=\"w\"/><d/></p:a>");
+}
+
+TEST(XMLSerializer, TheXMLPrefixIsNeverDeclared) {
+  const auto a = NSXMLElement::elementWithName(A("a"));
+  EXPECT_TRUE(a->addAttribute(NSXMLNode::attributeWithName(
+      A("xml:id"), A("i"), A("http://www.w3.org/XML/1998/namespace"))));
+  EXPECT_TRUE(a->addNamespace(
+      NSXMLNode::namespaceWithName(A("xml"), A("http://www.w3.org/XML/1998/namespace"))));
+  EXPECT_EQ(written(a.get()), "<a xml:id=\"i\"/>");
+}
+
+TEST(XMLSerializer, AnElementsNamePrevailsOverItsDeclarations) {
+  const auto a = NSXMLElement::elementWithName(A("p:a"), A("u"));
+  EXPECT_TRUE(a->addNamespace(NSXMLNode::namespaceWithName(A("p"), A("other"))));
+  EXPECT_EQ(written(a.get()), "<p:a xmlns:p=\"u\"/>");
+  const auto b = NSXMLElement::elementWithName(A("b"));
+  EXPECT_TRUE(b->addNamespace(NSXMLNode::namespaceWithName({}, A("other"))));
+  EXPECT_EQ(written(b.get()), "<b/>");
+}
+
+TEST(XMLSerializer, AnElementWithoutNamespaceLeavesTheDefaultNamespace) {
+  const auto a = NSXMLElement::elementWithName(A("a"), A("u"));
+  EXPECT_TRUE(a->addChild(NSXMLElement::elementWithName(A("b"))));
+  EXPECT_EQ(written(a.get()), "<a xmlns=\"u\"><b xmlns=\"\"/></a>");
+}
+
+TEST(XMLSerializer, AttributesWithClashingPrefixesGetFreeOnes) {
+  const auto a = NSXMLElement::elementWithName(A("p:a"), A("u"));
+  EXPECT_TRUE(a->addAttribute(NSXMLNode::attributeWithName(A("p:x"), A("1"), A("v"))));
+  EXPECT_TRUE(a->addAttribute(NSXMLNode::attributeWithName(A("y"), A("2"), A("v"))));
+  EXPECT_TRUE(a->addAttribute(NSXMLNode::attributeWithName(A("z"), A("3"), A("w"))));
+  const auto child = NSXMLElement::elementWithName(A("b"));
+  EXPECT_TRUE(child->addNamespace(NSXMLNode::namespaceWithName(A("ns1"), A("mine"))));
+  EXPECT_TRUE(child->addAttribute(NSXMLNode::attributeWithName(A("x"), A("4"), A("v"))));
+  EXPECT_TRUE(a->addChild(child));
+  EXPECT_EQ(written(a.get()),
+            "<p:a xmlns:p=\"u\" xmlns:ns1=\"v\" xmlns:ns2=\"w\" ns1:x=\"1\" ns1:y=\"2\" "
+            "ns2:z=\"3\"><b xmlns:ns1=\"mine\" xmlns:ns3=\"v\" ns3:x=\"4\"/></p:a>");
+  EXPECT_EQ(described(parsed(written(a.get()))->rootElement()), described(a.get()));
+}
+
+// --- round trips -------------------------------------------------------------------------------
+
+TEST(XMLSerializer, GeneratedDocumentsRoundTrip) {
+  for (uint32_t seed = 0; seed < 1500; ++seed) {
+    const std::string text = RandomDocument(seed).text();
+    const auto document = parsed(text, keepAll);
+    ASSERT_TRUE(document) << text;
+    const std::string once = written(document.get());
+    const auto again = parsed(once, keepAll);
+    ASSERT_TRUE(again) << once;
+    ASSERT_EQ(described(again.get()), described(document.get())) << text;
+    ASSERT_EQ(written(again.get()), once) << text;
+  }
+}
+
+TEST(XMLSerializer, FragmentsOfGeneratedDocumentsRoundTrip) {
+  for (uint32_t seed = 0; seed < 300; ++seed) {
+    const auto document = parsed(RandomDocument(seed).text(), keepAll);
+    for (const NSXMLNode* node = document->rootElement(); node; node = node->nextNode()) {
+      if (node->kind() != Kind::Element) continue;
+      const std::string fragment = written(node);
+      const auto again = parsed(fragment, keepAll);
+      ASSERT_TRUE(again) << fragment;
+      ASSERT_EQ(described(again->rootElement()), described(node)) << fragment;
+    }
+  }
+}
+
+TEST(XMLSerializer, WritingInPiecesGivesTheSame) {
+  std::string text = "<a>";
+  for (int index = 0; index < 30000; ++index) text += "<b>text &amp; more</b>";
+  text += std::string(300000, 'x') + "</a>";
+  const auto document = parsed(text);
+  std::string collected;
+  size_t largest = 0;
+  document->rootElement()->writeXML([&](std::string_view piece) {
+    collected += piece;
+    largest = std::max(largest, piece.size());
+    return true;
+  });
+  EXPECT_EQ(collected, text);
+  EXPECT_LE(largest, 65536u);
+  size_t calls = 0;
+  document->writeXML([&](std::string_view) { return ++calls < 3; });
+  EXPECT_EQ(calls, 3u);
+}
+
+}  // namespace
+}  // namespace xquery
