@@ -148,6 +148,17 @@ TEST(NodeInScopePrefixes, ADeclaredXMLPrefixIsNotAddedAgain) {
   EXPECT_EQ(joined(XQueryNodeInScopePrefixes(element.get())), "[xml][p]");
 }
 
+TEST(CopyNodeNamespaces, CopiesTheNearestDeclarationOfEachPrefix) {
+  const auto document = parse("<a xmlns:p='1' xmlns:q='2'><b xmlns:p='3'/></a>");
+  const auto namespaces = CopyXQueryNodeNamespaces(named(document, "b"));
+  ASSERT_EQ(namespaces.size(), 2U);
+  EXPECT_EQ(utf8(namespaces[0]->name()), "p");
+  EXPECT_EQ(utf8(namespaces[0]->stringValue()), "3");
+  EXPECT_EQ(utf8(namespaces[1]->name()), "q");
+  EXPECT_EQ(namespaces[0]->parent(), nullptr);
+  EXPECT_TRUE(CopyXQueryNodeNamespaces(root(parse("<a/>"))).empty());
+}
+
 struct EqualRow {
   const char* a;
   const char* b;
@@ -277,6 +288,11 @@ TEST(NodeResolveID, IsNotSupported) {
   EXPECT_FALSE(XQueryNodeResolveIDRef(document.get(), view("x")));
 }
 
+TEST(NodeRepresentation, IsTheNodesXML) {
+  EXPECT_EQ(utf8(XQueryNodeStringRepresentaion(root(parse("<a x=\"1\"><b/></a>")))),
+            "<a x=\"1\"><b/></a>");
+}
+
 TEST(NodeFromText, ParsesOrAnswersNull) {
   const auto document = XQueryNodeFromString(*text("<a>\xC3\xA9</a>"), 0);
   ASSERT_TRUE(document);
@@ -292,6 +308,13 @@ TEST(NodeFromText, TheOptionsGoToTheParser) {
   const auto dropped = XQueryNodeFromString(*text("<a> <b/> </a>"), 0);
   EXPECT_EQ(root(kept)->childCount(), 3U);
   EXPECT_EQ(root(dropped)->childCount(), 1U);
+}
+
+TEST(NodeConstructors, TextAndCDATABothMakeOrdinaryTextNodes) {
+  const auto string = text("a<b");
+  EXPECT_EQ(utf8(XQueryXMLNodeText(*string)->XMLString()), "a&lt;b");
+  EXPECT_EQ(utf8(XQueryXMLNodeCDATA(*string)->XMLString()), "a&lt;b");
+  EXPECT_EQ(XQueryXMLNodeCDATA(*string)->kind(), Kind::Text);
 }
 
 TEST(NodeConstructors, ACommentHoldsNoDoubleHyphenAndEndsInNone) {

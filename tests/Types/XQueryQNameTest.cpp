@@ -1,6 +1,10 @@
 #include "Types/XQueryQName.h"
 #include "TypesTestSupport.h"
 
+#include <array>
+#include <thread>
+#include <vector>
+
 namespace xquery {
 namespace {
 
@@ -90,6 +94,20 @@ TEST(QName, ItsInternedNameIsThatOfNodesOfTheSameName) {
   const Ref<XQueryQName> none = XQueryQName::qname(text("a"), nullptr);
   EXPECT_EQ(none->expandedName().get(), NSXMLElement::elementWithName(view("a"))->expandedName());
   EXPECT_NE(none->expandedName().get(), name->expandedName().get());
+}
+
+TEST(QName, SeveralThreadsInternOneNameAlike) {
+  const Ref<XQueryQName> name = XQueryQName::qname(text("p:shared"), text("urn:n"));
+  std::array<const NSXMLExpandedName*, 8> seen{};
+  std::vector<std::thread> threads;
+  for (auto& slot : seen) {
+    threads.emplace_back([&name, &slot] { slot = name->expandedName().get(); });
+  }
+  for (std::thread& thread : threads) thread.join();
+  for (const NSXMLExpandedName* interned : seen) {
+    EXPECT_NE(interned, nullptr);
+    EXPECT_EQ(interned, seen[0]);
+  }
 }
 
 }  // namespace
