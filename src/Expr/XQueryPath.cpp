@@ -60,6 +60,10 @@ void XQueryStep::setLast(Ref<XQueryStep> last) {
 
 void XQueryStep::setPredicates(std::vector<Ref<XQueryExpr>> predicates) {
   _predicates = std::move(predicates);
+  _literalPositions.clear();
+  for (const auto& predicate : _predicates) {
+    _literalPositions.push_back(literalPositionOf(predicate.get()));
+  }
 }
 
 void XQueryStep::bindInfoForProlog(XQueryProlog& prolog) {
@@ -187,7 +191,7 @@ void XQueryAxisStep::stream(int axis, NSXMLNode* node, XQueryPathRun& run) const
 
 // Gathers the nodes found from one context item, filters them and hands on what is left.
 void XQueryAxisStep::filter(NSXMLNode* node, XQueryPathRun& run) const {
-  std::vector<NSXMLNode*> nodes = run.takeNodeList();
+  std::vector<NSXMLNode*>& nodes = run.openNodeList();
   const size_t predicatesDone = collect(node, nodes, run);
   filterNodes(nodes, predicatesDone, run.context);
   if (_next) {
@@ -195,7 +199,7 @@ void XQueryAxisStep::filter(NSXMLNode* node, XQueryPathRun& run) const {
   } else {
     for (NSXMLNode* found : nodes) run.results.addNode(found, run.context);
   }
-  run.returnNodeList(std::move(nodes));
+  run.closeNodeList();
 }
 
 // Gathers the step's nodes along the axis, nearest first for a reverse axis. Answers how many

@@ -62,7 +62,9 @@ class XQueryStep : public NSCounted {
   // The same as handlePreicatesFromIndex over a list of nodes, in place.
   void filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex, XQueryContext& context) const;
   // The position that predicate `index` asks for when it is a numeric literal.
-  std::optional<uint64_t> literalPosition(size_t index) const;
+  const std::optional<uint64_t>& literalPosition(size_t index) const {
+    return _literalPositions[index];
+  }
   // Whether every predicate is a numeric literal, so that filtering evaluates nothing.
   bool hasOnlyLiteralPositions() const;
 
@@ -72,6 +74,7 @@ class XQueryStep : public NSCounted {
   std::vector<Ref<XQueryExpr>> _predicates;
 
  private:
+  static std::optional<uint64_t> literalPositionOf(const XQueryExpr* predicate);
   // processItems within one evaluation of a path: for a value of any shape, for one node, and for
   // the nodes that a step with predicates kept.
   virtual void processValue(const Value& items, XQueryPathRun& run, bool validate) const;
@@ -80,6 +83,8 @@ class XQueryStep : public NSCounted {
   friend class XQueryAxisStep;
   friend class XQueryFilterStep;
   friend class XQueryPathExpr;
+
+  std::vector<std::optional<uint64_t>> _literalPositions;  // one per predicate
 };
 
 class XQueryAxisStep : public XQueryStep {

@@ -34,14 +34,6 @@ const NSXMLExpandedName* XQueryPathRun::nameForDeferredTest(const XQueryNameTest
   return _deferredNames.back().second.get();
 }
 
-std::vector<NSXMLNode*> XQueryPathRun::takeNodeList() {
-  if (_nodeLists.empty()) return {};
-  std::vector<NSXMLNode*> nodes = std::move(_nodeLists.back());
-  _nodeLists.pop_back();
-  nodes.clear();
-  return nodes;
-}
-
 XQueryNodeTest::XQueryNodeTest(const XQueryExpr* expr, XQueryPathRun& run)
     : _expr(expr), _run(run) {
   switch (expr ? expr->kind() : Kind::None) {

@@ -8,6 +8,7 @@
 #include "xquery/XMLNode.h"
 
 #include <cstdint>
+#include <deque>
 #include <utility>
 #include <vector>
 
@@ -31,15 +32,22 @@ class XQueryPathRun {
   // is evaluated. Null for a name that no node can have.
   const NSXMLExpandedName* nameForDeferredTest(const XQueryNameTest& test);
 
-  // Lists of nodes, used again by the next step with predicates.
-  std::vector<NSXMLNode*> takeNodeList();
-  void returnNodeList(std::vector<NSXMLNode*> nodes) { _nodeLists.push_back(std::move(nodes)); }
+  // A list for the nodes of one context item, empty; lists are closed in the reverse order of their
+  // opening and used again by the next context item. An error abandons them with the run.
+  std::vector<NSXMLNode*>& openNodeList() {
+    if (_openNodeLists == _nodeLists.size()) _nodeLists.emplace_back();
+    std::vector<NSXMLNode*>& nodes = _nodeLists[_openNodeLists++];
+    nodes.clear();
+    return nodes;
+  }
+  void closeNodeList() { --_openNodeLists; }
 
  private:
   enum class DefaultNamespace : uint8_t { Unknown, None, Present };
 
   std::vector<std::pair<const XQueryNameTest*, NSXMLExpandedNameRef>> _deferredNames;
-  std::vector<std::vector<NSXMLNode*>> _nodeLists;
+  std::deque<std::vector<NSXMLNode*>> _nodeLists;
+  size_t _openNodeLists = 0;
   DefaultNamespace _defaultNamespace = DefaultNamespace::Unknown;
 };
 

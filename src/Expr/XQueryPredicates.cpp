@@ -88,17 +88,15 @@ void keepNodes(std::vector<NSXMLNode*>& nodes, const XQueryExpr& predicate,
 
 }  // namespace
 
-std::optional<uint64_t> XQueryStep::literalPosition(size_t index) const {
-  const XQueryLiteral* literal = literalIn(_predicates[index].get());
+std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicate) {
+  const XQueryLiteral* literal = literalIn(predicate);
   if (!literal || !XQueryIsNumericType(literal->literalValue().get())) return std::nullopt;
   return cast<NSNumber>(literal->literalValue())->unsignedIntegerValue();
 }
 
 bool XQueryStep::hasOnlyLiteralPositions() const {
-  for (size_t i = 0; i < _predicates.size(); ++i) {
-    if (!literalPosition(i)) return false;
-  }
-  return true;
+  return std::all_of(_literalPositions.begin(), _literalPositions.end(),
+                     [](const auto& position) { return position.has_value(); });
 }
 
 Value XQueryStep::handlePreicatesFromIndex(size_t index, Value items,
