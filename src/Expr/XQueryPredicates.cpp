@@ -4,7 +4,6 @@
 // once per item with the item as focus; a number selects by position, anything else by its truth.
 // An error in a predicate drops the item it arose for and nothing more: a path over irregular data
 // keeps what fits. Reaching an engine limit is no such error and ends the evaluation.
-#include "Eval/StackGuard.h"
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
