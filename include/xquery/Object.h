@@ -16,14 +16,13 @@
 //   an NSArray       a sequence of its elements
 #pragma once
 
+#include "xquery/Export.h"
+
 #include <cstddef>
 #include <cstdint>
+#include <sys/single_threaded.h>
 #include <type_traits>
 #include <utility>
-
-#include <sys/single_threaded.h>
-
-#include "xquery/Export.h"
 
 namespace xquery {
 
@@ -93,7 +92,9 @@ enum class Kind : uint8_t {
   ExprLast = 255,
 };
 
-constexpr bool isNodeKind(Kind kind) { return kind >= Kind::Document && kind <= Kind::Text; }
+constexpr bool isNodeKind(Kind kind) {
+  return kind >= Kind::Document && kind <= Kind::Text;
+}
 
 class NSObject {
  public:
@@ -129,14 +130,20 @@ class XQUERY_EXPORT NSCounted : public NSObject {
   }
 
   void release() const {
-    const uint32_t count = __atomic_load_n(&_word, __ATOMIC_RELAXED);
+    const uint32_t count = __atomic_load_n(&_word, __ATOMIC_ACQUIRE);
     if (count & immortalBit) return;
-    if (__libc_single_threaded) {
-      if ((_word = count - 1) == 0) destroy(this);
+    // Who holds the only reference needs no atomic step: nobody else can count at the same time.
+    if (count == 1) {
+      destroy(this);
+    } else if (__libc_single_threaded) {
+      _word = count - 1;
     } else if (__atomic_fetch_sub(&_word, 1U, __ATOMIC_ACQ_REL) == 1) {
       destroy(this);
     }
   }
+
+  // The retain of a reference to an object that no other thread can know yet.
+  void retainNew() const { ++_word; }
 
   // For shared singletons: from now on the object is never freed.
   void makeImmortal() const { _word |= immortalBit; }
@@ -218,6 +225,14 @@ class Ref {
   T& operator*() const { return *_object; }
   explicit operator bool() const { return _object != nullptr; }
 
+  // The first reference to an object just made.
+  static Ref toNewObject(T* object) {
+    Ref reference;
+    reference._object = object;
+    object->retainNew();
+    return reference;
+  }
+
   // Gives up the reference without releasing it.
   T* detach() noexcept { return std::exchange(_object, nullptr); }
 
@@ -264,7 +279,7 @@ class Ref {
 // Makes a counted object: make<NSArray>(...).
 template <class T, class... Arguments>
 [[nodiscard]] Ref<T> make(Arguments&&... arguments) {
-  return Ref<T>(new T(std::forward<Arguments>(arguments)...));
+  return Ref<T>::toNewObject(new T(std::forward<Arguments>(arguments)...));
 }
 
 template <class T>

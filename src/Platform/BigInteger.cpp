@@ -8,6 +8,13 @@ BigInteger BigInteger::fromUnsigned(uint64_t value) {
   return result;
 }
 
+BigInteger BigInteger::fromHalves(uint64_t high, uint64_t low) {
+  const uint64_t words[] = {low, high};
+  BigInteger result;
+  mpz_import(result._value, 2, -1, sizeof(uint64_t), 0, 0, words);
+  return result;
+}
+
 BigInteger BigInteger::fromDigits(const std::string& digits) {
   BigInteger result;
   mpz_set_str(result._value, digits.c_str(), 10);

@@ -14,6 +14,7 @@ class BigInteger {
   BigInteger() { mpz_init(_value); }
   BigInteger(int64_t value) { mpz_init_set_si(_value, value); }
   static BigInteger fromUnsigned(uint64_t value);
+  static BigInteger fromHalves(uint64_t high, uint64_t low);
   // Decimal digits only.
   static BigInteger fromDigits(const std::string& digits);
   static BigInteger powerOfTen(uint32_t exponent);
@@ -34,6 +35,7 @@ class BigInteger {
 
   int sign() const { return mpz_sgn(_value); }
   bool isOdd() const { return mpz_odd_p(_value) != 0; }
+  bool isDivisibleBy(uint32_t divisor) const { return mpz_divisible_ui_p(_value, divisor) != 0; }
   bool fitsInt64() const { return mpz_fits_slong_p(_value) != 0; }
   int64_t int64() const { return mpz_get_si(_value); }
   bool fitsUInt64() const { return mpz_fits_ulong_p(_value) != 0; }

@@ -11,8 +11,10 @@
 #include <algorithm>
 #include <charconv>
 #include <cmath>
+#include <cstdlib>
 #include <limits>
 #include <memory>
+#include <numeric>
 #include <stdexcept>
 
 namespace xquery {
@@ -39,9 +41,10 @@ constexpr int64_t smallPowers[maximumSmallPower + 1] = {1,
                                                         10000000000000000,
                                                         100000000000000000,
                                                         1000000000000000000};
-constexpr size_t quotientDigits = 38;
+constexpr uint32_t quotientDigits = 38;
 
 __extension__ using Int128 = __int128;
+__extension__ using UInt128 = unsigned __int128;
 
 Int128 wideMagnitude(int64_t value) {
   return value < 0 ? -Int128{value} : Int128{value};
@@ -65,6 +68,12 @@ bool roundsAway(NSRoundingMode mode, bool negative, int half, bool odd) {
       return half > 0 || (half == 0 && odd);
   }
   return false;
+}
+
+uint32_t digitCount(uint64_t value) {
+  uint32_t count = 0;
+  for (; value != 0; value /= 10) ++count;
+  return count;
 }
 
 // How often `factor` divides `value`, which is not zero; divides it out.
@@ -142,6 +151,7 @@ class NSDecimalArithmetic {
 
   static bool divideSmall(const NSDecimal& a, const NSDecimal& b, NSDecimal& quotient);
   static NSDecimal divideBig(const NSDecimal& a, const NSDecimal& b);
+  static NSDecimal roundedSmallQuotient(int64_t numerator, uint64_t denominator);
   static NSDecimal roundedQuotient(BigInteger numerator, BigInteger denominator);
   static NSDecimal roundSmall(const NSDecimal& value, int64_t drop, int32_t scale,
                               NSRoundingMode mode);
@@ -154,6 +164,7 @@ class NSDecimalArithmetic {
   }
 
   static void stripZeros(BigInteger& coefficient, int64_t& scale) {
+    if (!coefficient.isDivisibleBy(10)) return;
     // Only zeros after the point go, those before it are put back.
     const int64_t zeros = coefficient.removeFactor(10);
     if (zeros > scale) coefficient.multiplyByPowerOfTen(static_cast<uint32_t>(zeros - scale));
@@ -281,7 +292,7 @@ NSDecimal NSDecimal::multiply(const NSDecimal& other) const {
   return Arithmetic::big(std::move(result), int64_t{_scale} + other._scale);
 }
 
-// Quotients of small decimals that end within 64 bits.
+// Quotients of small decimals that end within 64 bits or do not end at all; false for the others.
 bool NSDecimalArithmetic::divideSmall(const NSDecimal& a, const NSDecimal& b, NSDecimal& quotient) {
   int64_t numerator = 0;
   int64_t denominator = 0;
@@ -291,23 +302,18 @@ bool NSDecimalArithmetic::divideSmall(const NSDecimal& a, const NSDecimal& b, NS
     quotient = NSDecimal();
     return true;
   }
-  for (int64_t x = numerator, y = denominator;;) {  // Euclid's algorithm
-    if (x % y == 0) {
-      numerator /= y;
-      denominator /= y;
-      break;
-    }
-    y = std::exchange(x, y) % y;
-  }
-  if (denominator < 0) {
-    numerator = -numerator;
-    denominator = -denominator;
-  }
+  const int64_t divisor = std::gcd(numerator, denominator);
+  numerator /= denominator < 0 ? -divisor : divisor;
+  denominator = std::abs(denominator) / divisor;
   int64_t rest = denominator;
   const uint32_t twos = removeSmallFactor(rest, 2);
   const uint32_t fives = removeSmallFactor(rest, 5);
+  if (rest != 1) {
+    quotient = roundedSmallQuotient(numerator, static_cast<uint64_t>(denominator));
+    return true;
+  }
   const auto scale = static_cast<int32_t>(std::max(twos, fives));
-  if (rest != 1 || scale > maximumSmallPower) return false;
+  if (scale > maximumSmallPower) return false;
   int64_t coefficient = 0;
   if (__builtin_mul_overflow(numerator, smallPowers[scale] / denominator, &coefficient)) {
     return false;
@@ -316,10 +322,34 @@ bool NSDecimalArithmetic::divideSmall(const NSDecimal& a, const NSDecimal& b, NS
   return true;
 }
 
+// 38 significant digits, which fit 128 bits, by long division in steps of up to 18 digits. The
+// quotient does not end, so that no remainder is exactly a half.
+NSDecimal NSDecimalArithmetic::roundedSmallQuotient(int64_t numerator, uint64_t denominator) {
+  const auto magnitude = static_cast<uint64_t>(std::abs(numerator));
+  UInt128 digits = magnitude / denominator;
+  uint64_t remainder = magnitude % denominator;
+  uint32_t count = digitCount(static_cast<uint64_t>(digits));
+  int32_t scale = 0;
+  while (count < quotientDigits) {
+    const uint32_t step = std::min<uint32_t>(maximumSmallPower, quotientDigits - count);
+    const UInt128 dividend = UInt128{remainder} * static_cast<uint64_t>(smallPowers[step]);
+    const auto next = static_cast<uint64_t>(dividend / denominator);
+    remainder = static_cast<uint64_t>(dividend % denominator);
+    count = digits == 0 ? digitCount(next) : count + step;
+    digits = digits * static_cast<uint64_t>(smallPowers[step]) + next;
+    scale += static_cast<int32_t>(step);
+  }
+  if (remainder > denominator - remainder) ++digits;
+  BigInteger coefficient =
+      BigInteger::fromHalves(static_cast<uint64_t>(digits >> 64), static_cast<uint64_t>(digits));
+  if (numerator < 0) coefficient.negate();
+  return big(std::move(coefficient), scale);
+}
+
 // 38 significant digits of a quotient that does not end (or ends too late to be written out).
 NSDecimal NSDecimalArithmetic::roundedQuotient(BigInteger numerator, BigInteger denominator) {
   // The estimates of the digit counts may each be one too large; this yields 40 to 43 digits.
-  const int64_t shift = static_cast<int64_t>(quotientDigits) + 3 +
+  const int64_t shift = int64_t{quotientDigits} + 3 +
                         static_cast<int64_t>(denominator.digitsAtMost()) -
                         static_cast<int64_t>(numerator.digitsAtMost());
   if (shift > 0) numerator.multiplyByPowerOfTen(static_cast<uint32_t>(shift));

@@ -103,6 +103,11 @@ double readDouble(std::string_view text, const NumberExtent& extent) {
 template <class Float>
 std::string formatShortest(Float value) {
   char buffer[64];
+  // Whole numbers that the type holds exactly are their own shortest digits; not so minus zero.
+  constexpr Float exactIntegers = 1 << std::min(std::numeric_limits<Float>::digits, 30);
+  if (value == std::trunc(value) && std::abs(value) < exactIntegers && value != 0) {
+    return {buffer, std::to_chars(buffer, buffer + sizeof buffer, static_cast<int64_t>(value)).ptr};
+  }
   const std::to_chars_result written =
       std::to_chars(buffer, buffer + sizeof buffer, value, std::chars_format::scientific);
   const std::string_view text(buffer, static_cast<size_t>(written.ptr - buffer));
