@@ -1,4 +1,5 @@
 #include "xquery/String.h"
+#include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
 
@@ -119,6 +120,48 @@ TEST(String, CopiesTheTextItIsMadeFrom) {
   const Ref<NSString> text = NSString::stringWithUTF8(buffer);
   buffer.assign(100, 'b');
   EXPECT_EQ(text->utf8(), std::string(100, 'a'));
+}
+
+// Strings of a kind of their own, as the engine's typed strings are.
+class KindString : public NSString {
+ public:
+  KindString(uint16_t aux, const NSString& text) : NSString(Kind::TypedString, aux, text) {}
+  uint16_t aux() const { return _aux; }
+};
+
+TEST(String, TextOfANodeOutlivesTheLastReferenceToTheNode) {
+  const std::string narrow(200, 'n');
+  const std::u16string wide(200, u'\u20AC');
+  Ref<NSXMLNode> narrowNode = NSXMLNode::textWithStringValue(NSStringView::ascii(narrow));
+  Ref<NSXMLNode> wideNode = NSXMLNode::textWithStringValue({wide.data(), 200});
+  const Ref<NSString> narrowText = narrowNode->stringValue();
+  const Ref<NSString> wideText = wideNode->stringValue();
+  const Ref<KindString> shared = make<KindString>(uint16_t{9}, *narrowText);
+  narrowNode = nullptr;
+  wideNode = nullptr;
+  EXPECT_EQ(narrowText->utf8(), narrow);
+  EXPECT_EQ(unitsOf(wideText), wide);
+  EXPECT_EQ(shared->utf8(), narrow);
+}
+
+TEST(String, SharedTextOutlivesTheStringItCameFrom) {
+  for (const size_t length : {0, 5, 24, 25, 500}) {
+    const std::string expected(length, 's');
+    Ref<NSString> original = NSString::stringWithUTF8(expected);
+    Ref<KindString> first = make<KindString>(uint16_t{9}, *original);
+    const Ref<KindString> second = make<KindString>(uint16_t{31}, *first);
+    original = nullptr;
+    first = nullptr;
+    EXPECT_EQ(second->utf8(), expected);
+    EXPECT_EQ(second->aux(), 31);
+    EXPECT_EQ(second->kind(), Kind::TypedString);
+  }
+}
+
+TEST(String, WideTextOfATreeThatFits8BitsIsStoredSo) {
+  const Ref<NSXMLNode> node = NSXMLNode::textWithStringValue(NSStringView::ascii("owner"));
+  const std::u16string wide(100, u'w');
+  EXPECT_FALSE(NSString::stringInTreeOf(node.get(), {wide.data(), 100})->view().isWide());
 }
 
 TEST(MutableString, StaysNarrowUntilAWideUnitComes) {
