@@ -68,6 +68,7 @@ enum class Kind : uint8_t {
   FunctionDecl,
   VarDecl,
   ParsedModule,
+  ParserText,
   PathResults,
   PathStepFirst,
   AxisStep = PathStepFirst,

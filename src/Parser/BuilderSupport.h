@@ -1,0 +1,63 @@
+// What the builders share.
+#pragma once
+
+#include <string_view>
+
+#include "Expr/XQueryExpr.h"
+#include "Expr/XQueryLeaves.h"
+#include "Parser/Builders.h"
+#include "Parser/XQueryParser.h"
+#include "xquery/Collection.h"
+
+namespace xquery {
+
+template <class T>
+Ref<T> XQRef(NSObject* object) {
+  return Ref<T>(cast<T>(object));
+}
+
+// Hands an expression to the pool, with its line.
+template <class T>
+NSObject* XQAtLine(Ref<T> expr, int64_t line) {
+  expr->setExprLine(line);
+  return XQueryParserAutoRelease(std::move(expr));
+}
+
+inline NSObject* XQList(NSObject* item) {
+  Ref<NSArray> list = NSArray::array();
+  if (item) list->objects().emplace_back(item);
+  return XQueryParserAutoRelease(std::move(list));
+}
+
+inline NSObject* XQListAdd(NSObject* list, NSObject* item) {
+  cast<NSArray>(list)->objects().emplace_back(item);
+  return list;
+}
+
+// Appends one item, or the items of a list one by one.
+inline NSObject* XQListAddAll(NSObject* list, NSObject* itemOrItems) {
+  if (!itemOrItems) return list;
+  const NSArray* items = dyn_cast<NSArray>(itemOrItems);
+  if (!items) return XQListAdd(list, itemOrItems);
+  auto& objects = cast<NSArray>(list)->objects();
+  objects.insert(objects.end(), items->objects().begin(), items->objects().end());
+  return list;
+}
+
+template <class T>
+std::vector<Ref<T>> XQVector(NSObject* list) {
+  std::vector<Ref<T>> result;
+  if (!list) return result;
+  const NSArray* array = cast<NSArray>(list);
+  result.reserve(array->count());
+  for (const Value& object : array->objects()) result.push_back(XQRef<T>(object.get()));
+  return result;
+}
+
+// Reports a construct that cannot be compiled and stands in for it.
+inline NSObject* XQUnavailable(std::string_view construct, int64_t line) {
+  XQueryParserUnavailable(construct, line);
+  return XQEmptyLiteral(line);
+}
+
+}  // namespace xquery

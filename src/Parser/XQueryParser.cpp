@@ -1,0 +1,196 @@
+#include "Parser/XQueryParser.h"
+
+#include "Parser/XQueryScanner.h"
+#include "Parser/XQueryTokens.h"
+#include "Platform/NSLog.h"
+
+#include <algorithm>
+#include <climits>
+#include <cstring>
+#include <exception>
+
+namespace xquery {
+namespace {
+
+std::mutex sXQueryParserLock;
+XQueryParser* sXQueryParserCurrent = nullptr;
+unsigned sXQueryParserSetterFlags = 0;
+
+struct SetterError {
+  unsigned flag;
+  int64_t number;
+  const char* message;
+};
+
+constexpr SetterError setterErrors[] = {
+    {XQuerySetterXMLSpace, 68, "Prolog contains more than one xmlspace declaration"},
+    {XQuerySetterDefaultCollation, 38,
+     "Prolog contains more than one default collation declaration"},
+    {XQuerySetterBaseURI, 32, "Prolog contains more than one base URI declaration"},
+    {XQuerySetterConstruction, 67, "Prolog contains more than one construction declaration"},
+    {XQuerySetterOrdering, 65, "Prolog contains more than one ordering mode declaration"},
+    {XQuerySetterEmptyOrdering, 69, "Prolog contains more than one empty ordering declaration"},
+    {XQuerySetterInheritNamespaces, 55,
+     "Prolog contains more than one inherit-namespaces declaration"},
+};
+
+void record(Ref<XQueryError> error, std::string_view text) {
+  if (XQueryLogEnabled()) NSLog(text);
+  sXQueryParserCurrent->setError(std::move(error));
+}
+
+// `text`, " - " or "- ", and the current source line.
+std::string withSourceLine(std::string text, std::string_view separator) {
+  text += separator;
+  sXQueryParserCurrent->sourceLine(XQlineno)->view().appendUTF8To(text);
+  return text;
+}
+
+}  // namespace
+
+NSObject* yyparse_result = nullptr;
+
+XQueryParser::Session::Session(XQueryParser& parser) : _lock(sXQueryParserLock), _parser(parser) {
+  sXQueryParserCurrent = &parser;
+  sXQueryParserSetterFlags = 0;
+}
+
+XQueryParser::Session::~Session() {
+  XQueryScannerEnd();
+  yyparse_result = nullptr;
+  _parser._pool.clear();
+  _parser._blocks.clear();
+  sXQueryParserCurrent = nullptr;
+}
+
+Ref<XQueryParser> XQueryParser::unparsedParserWithSource(Ref<NSString> source) {
+  return make<XQueryParser>(std::move(source));
+}
+
+Ref<XQueryParser> XQueryParser::parserWithSource(Ref<NSString> source) {
+  Ref<XQueryParser> parser = unparsedParserWithSource(std::move(source));
+  parser->parse();
+  return parser;
+}
+
+XQueryParser* XQueryParser::currentParser() { return sXQueryParserCurrent; }
+
+void XQueryParser::parse() {
+  const Session session(*this);
+  try {
+    XQueryScannerInit(XQueryStateDEFAULT);
+    yyparse_result = nullptr;
+    // A failed run may leave what an unfinished rule had built.
+    if (XQparse() == 0) _parsedModule = cast<XQueryParsedModule>(yyparse_result);
+    reportUnavailable();
+  } catch (const NSException&) {
+    // The error was recorded before it was raised.
+    _parsedModule = nullptr;
+  } catch (const std::exception& failure) {
+    _parsedModule = nullptr;
+    setError(XQueryError::error(3, failure.what()));
+  }
+}
+
+void XQueryParser::setUnavailable(std::string_view construct, int64_t line) {
+  if (!_unavailable.empty() && _unavailableLine <= line) return;
+  _unavailable = construct;
+  _unavailableLine = line;
+}
+
+void XQueryParser::reportUnavailable() {
+  if (_unavailable.empty() || !_errors.empty()) return;
+  const std::string text = _unavailable + " are not available in this build";
+  record(XQueryError::error(0, text, _unavailableLine), text);
+}
+
+Ref<NSString> XQueryParser::sourceLine(int64_t index) {
+  if (_sourceLines.empty()) {
+    const NSStringView text = _source->view();
+    for (uint32_t start = 0;;) {
+      const uint32_t end = text.find(u'\n', start);
+      if (end == NSStringView::notFound) {
+        _sourceLines.push_back(NSString::stringWithView(text.substring(start)));
+        break;
+      }
+      _sourceLines.push_back(NSString::stringWithView(text.substring(start, end - start)));
+      start = end + 1;
+    }
+  }
+  if (index < 0 || static_cast<uint64_t>(index) >= _sourceLines.size()) return NSString::empty();
+  return _sourceLines[static_cast<size_t>(index)];
+}
+
+size_t XQueryParser::remainingBytes() {
+  if (!_hasUTF8String) {
+    _utf8String = _source->utf8();
+    _length = _utf8String.size();
+    _hasUTF8String = true;
+  }
+  return _length - _position;
+}
+
+size_t XQueryParser::readChars(size_t maxBytes, char* toBuffer) {
+  const size_t count = std::min(maxBytes, remainingBytes());
+  std::memcpy(toBuffer, _utf8String.data() + _position, count);
+  _position += count;
+  return count;
+}
+
+void* XQueryParser::allocate(size_t size) {
+  _blocks.push_back(std::make_unique_for_overwrite<char[]>(size));
+  return _blocks.back().get();
+}
+
+size_t XQueryParserReadChars(char* buffer, size_t maxBytes) {
+  return sXQueryParserCurrent->readChars(maxBytes, buffer);
+}
+
+NSString* XQueryParserSting(std::string_view bytes) {
+  return XQueryParserAutoRelease(NSString::stringWithUTF8(bytes));
+}
+
+void* XQueryParserAllocate(size_t size) { return sXQueryParserCurrent->allocate(size); }
+
+void XQerror(const char* message) {
+  std::string text = message;
+  text += " invalid token (";
+  text += XQScannerTokenText();
+  text = withSourceLine(std::move(text) + ")", "- ");
+  record(XQueryError::error(3, text, XQlineno), text);
+}
+
+void XQueryParseError(std::string_view message) {
+  const std::string text = withSourceLine(std::string(message), " - ");
+  record(XQueryError::error(3, text, XQlineno), text);
+}
+
+void XQueryFatalError(const char* message) {
+  record(XQueryError::error(3, message), message);
+  throw NSException("XQueryLexFatalErr", NSString::stringWithUTF8(message));
+}
+
+void XQueryParserExtension(const Ref<NSString>& name, const Ref<NSString>& content, int64_t line) {
+  const std::string text = "must-understand extension not supported (" + name->utf8() + " " +
+                           content->utf8() + ")";
+  record(XQueryError::error(14, text, line), text);
+}
+
+void XQueryParserPragma(const Ref<NSString>&, const Ref<NSString>&, int64_t) {}
+
+void XQueryParserSetSetterFlag(unsigned flag, int64_t line) {
+  for (const SetterError& row : setterErrors) {
+    if (row.flag != flag) continue;
+    if (sXQueryParserSetterFlags & flag) {
+      sXQueryParserCurrent->setError(XQueryError::error(row.number, row.message, line));
+    }
+    sXQueryParserSetterFlags |= flag;
+    return;
+  }
+}
+
+void XQueryParserUnavailable(std::string_view construct, int64_t line) {
+  sXQueryParserCurrent->setUnavailable(construct, line);
+}
+
+}  // namespace xquery
