@@ -55,8 +55,8 @@ void XQExtensionClose();
 // What stands at the start of the rest of the input, where a name or a ")" begins.
 struct XQueryScannedWord {
   size_t length = 0;
-  int token = 0;          // 0 for what is no token of its own
-  std::string_view name;  // the token's value
+  int token = 0;               // 0 for what is no token of its own
+  std::string_view name = {};  // the token's value
   int push = -1;
   int next = -1;
   char quote = '\0';  // opens a string literal that will be the token

@@ -40,18 +40,17 @@
 
 using namespace xquery;
 
-/* The generator's name for the error token is that of the callback. */
-#undef yyerror
-#define yyerror(message) xquery::XQerror(message)
 /* The generator's two messages in the words that users of the engine know. */
-#define YY_(message) XQParserMessage(message)
-
-static const char* XQParserMessage(const char* message) {
-  const std::string_view text(message);
-  if (text == "syntax error") return "parse error";
-  if (text == "memory exhausted") return "parser stack overflow";
-  return message;
+static void XQReport(std::string_view message) {
+  if (message == "syntax error") message = "parse error";
+  if (message == "memory exhausted") message = "parser stack overflow";
+  xquery::XQerror(message.data());
 }
+
+/* The callback bears the name that the generator also gives to its error token. */
+#undef yyerror
+#define yyerror XQReport
+#define XQerror XQtokentype::XQerror
 
 static XQSTYPE XQValue(int32_t line, NSObject* value) {
   XQSTYPE result = {};
