@@ -1,13 +1,13 @@
 // What the builders share.
 #pragma once
 
-#include <string_view>
-
 #include "Expr/XQueryExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Parser/Builders.h"
 #include "Parser/XQueryParser.h"
 #include "xquery/Collection.h"
+
+#include <string_view>
 
 namespace xquery {
 

@@ -11,13 +11,14 @@
 // answer the empty literal, so that the rest of the query is still checked.
 #pragma once
 
-#include <cstdint>
-
 #include "xquery/Object.h"
+
+#include <cstdint>
 
 namespace xquery {
 
-// --- modules and prolog (BuildersProlog.cpp) -------------------------------------------------------
+// --- modules and prolog (BuildersProlog.cpp)
+// -------------------------------------------------------
 
 NSObject* XQMainModule(NSObject* version, NSObject* prologItems, NSObject* body);
 NSObject* XQLibraryModule(NSObject* version, NSObject* moduleNamespace, NSObject* prologItems);
@@ -55,7 +56,8 @@ NSObject* XQParam(NSObject* name, NSObject* type, int64_t line);
 NSObject* XQParamList(NSObject* param);
 NSObject* XQParamListAdd(NSObject* params, NSObject* param);
 
-// --- expressions (BuildersExpressions.cpp) -----------------------------------------------------------
+// --- expressions (BuildersExpressions.cpp)
+// -----------------------------------------------------------
 
 NSObject* XQExpr(NSObject* expr, int64_t line);
 NSObject* XQExprAdd(NSObject* list, NSObject* expr);
@@ -118,7 +120,8 @@ int XQOperatorType(NSObject* expr);
 int64_t XQExprLine(NSObject* expr);
 NSObject* XQExprSetLine(NSObject* expr, int64_t line);
 
-// --- paths (BuildersPaths.cpp) -----------------------------------------------------------------------
+// --- paths (BuildersPaths.cpp)
+// -----------------------------------------------------------------------
 
 // A lone filter step without predicates is its own expression.
 NSObject* XQRelativePath(NSObject* firstStep, int64_t line);
@@ -135,7 +138,8 @@ NSObject* XQLocalName(NSObject* name, int64_t line);
 // A null prefix means any namespace, a null local name any name.
 NSObject* XQWildCardNameTest(NSObject* prefix, NSObject* localName, int64_t line);
 
-// --- types (BuildersTypes.cpp) -----------------------------------------------------------------------
+// --- types (BuildersTypes.cpp)
+// -----------------------------------------------------------------------
 
 // "*" in a kind test is no name test at all.
 NSObject* XQNodeNameWildCard();
@@ -156,7 +160,8 @@ NSObject* XQSequenceTypeEmpty(int64_t line);
 NSObject* XQSingleType(NSObject* type, int occurrenceToken);
 NSObject* XQSequenceType(NSObject* type, int occurrenceToken);
 
-// --- constructors (BuildersConstructors.cpp) -----------------------------------------------------------
+// --- constructors (BuildersConstructors.cpp)
+// -----------------------------------------------------------
 
 NSObject* XQElementConstructor(NSObject* name, NSObject* attributes, NSObject* content,
                                int64_t line);

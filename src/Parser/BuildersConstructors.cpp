@@ -23,9 +23,13 @@ NSObject* XQElementConstructor(NSObject*, NSObject*, NSObject*, int64_t line) {
   return XQUnavailable(elements, line);
 }
 
-NSObject* XQAttributeList(NSObject* item) { return XQList(item); }
+NSObject* XQAttributeList(NSObject* item) {
+  return XQList(item);
+}
 
-NSObject* XQAttributeListAdd(NSObject* list, NSObject* item) { return XQListAdd(list, item); }
+NSObject* XQAttributeListAdd(NSObject* list, NSObject* item) {
+  return XQListAdd(list, item);
+}
 
 NSObject* XQAttributeListItem(NSObject*, NSObject*, int, int64_t line) {
   return XQUnavailable(elements, line);
@@ -43,15 +47,21 @@ NSObject* XQAttributeValueCharsAddUnicode(NSObject* items, char16_t unit) {
   return XQListAdd(items, XQChars(unit));
 }
 
-NSObject* XQAttributeValueCharsWithExpr(NSObject* expr) { return XQList(expr); }
+NSObject* XQAttributeValueCharsWithExpr(NSObject* expr) {
+  return XQList(expr);
+}
 
 NSObject* XQAttributeValueCharsAddExpr(NSObject* items, NSObject* expr) {
   return XQListAdd(items, expr);
 }
 
-NSObject* XQElementContent(NSObject* item) { return XQList(item); }
+NSObject* XQElementContent(NSObject* item) {
+  return XQList(item);
+}
 
-NSObject* XQElementContentAdd(NSObject* items, NSObject* item) { return XQListAdd(items, item); }
+NSObject* XQElementContentAdd(NSObject* items, NSObject* item) {
+  return XQListAdd(items, item);
+}
 
 NSObject* XQElementContentWithUnicode(char16_t unit) {
   return XQElementContentAddUnicode(XQList(nullptr), unit);
@@ -88,11 +98,17 @@ NSObject* XQCharsAdd(NSObject* text, char16_t unit) {
   return text;
 }
 
-NSObject* XQCdataSection(NSObject*, int64_t line) { return XQUnavailable("CDATA sections", line); }
+NSObject* XQCdataSection(NSObject*, int64_t line) {
+  return XQUnavailable("CDATA sections", line);
+}
 
-NSObject* XQXmlComment(NSObject*, int64_t line) { return XQUnavailable(comments, line); }
+NSObject* XQXmlComment(NSObject*, int64_t line) {
+  return XQUnavailable(comments, line);
+}
 
-NSObject* XQXmlPI(NSObject*, NSObject*, int64_t line) { return XQUnavailable(instructions, line); }
+NSObject* XQXmlPI(NSObject*, NSObject*, int64_t line) {
+  return XQUnavailable(instructions, line);
+}
 
 NSObject* XQCompDocConstructor(NSObject*, int64_t line) {
   return XQUnavailable("document constructors", line);
@@ -110,7 +126,9 @@ NSObject* XQComputedPI(NSObject*, NSObject*, int64_t line) {
   return XQUnavailable(instructions, line);
 }
 
-NSObject* XQComputedXmlComment(NSObject*, int64_t line) { return XQUnavailable(comments, line); }
+NSObject* XQComputedXmlComment(NSObject*, int64_t line) {
+  return XQUnavailable(comments, line);
+}
 
 NSObject* XQCompTextConstructor(NSObject*, int64_t line) {
   return XQUnavailable("text constructors", line);

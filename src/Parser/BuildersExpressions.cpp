@@ -82,7 +82,9 @@ NSObject* XQForClause(NSObject*, NSObject*, NSObject*, NSObject*, int64_t line) 
   return XQUnavailable(flwor, line);
 }
 
-NSObject* XQForClauseItems(NSObject* clause) { return XQList(clause); }
+NSObject* XQForClauseItems(NSObject* clause) {
+  return XQList(clause);
+}
 
 NSObject* XQForClauseItemsAdd(NSObject* clauses, NSObject* clause) {
   return XQListAdd(clauses, clause);
@@ -92,35 +94,53 @@ NSObject* XQLetClause(NSObject*, NSObject*, NSObject*, int64_t line) {
   return XQUnavailable(flwor, line);
 }
 
-NSObject* XQLetClauseItems(NSObject* clause) { return XQList(clause); }
+NSObject* XQLetClauseItems(NSObject* clause) {
+  return XQList(clause);
+}
 
 NSObject* XQLetClauseItemsAdd(NSObject* clauses, NSObject* clause) {
   return XQListAdd(clauses, clause);
 }
 
-NSObject* XQWhereClause(NSObject* expr) { return expr; }
+NSObject* XQWhereClause(NSObject* expr) {
+  return expr;
+}
 
-NSObject* XQOrderByClause(NSObject* specs) { return specs; }
+NSObject* XQOrderByClause(NSObject* specs) {
+  return specs;
+}
 
-NSObject* XQOrderSpecList(NSObject* spec) { return XQList(spec); }
+NSObject* XQOrderSpecList(NSObject* spec) {
+  return XQList(spec);
+}
 
-NSObject* XQOrderSpecListAdd(NSObject* specs, NSObject* spec) { return XQListAdd(specs, spec); }
+NSObject* XQOrderSpecListAdd(NSObject* specs, NSObject* spec) {
+  return XQListAdd(specs, spec);
+}
 
-NSObject* XQOrderSpec(NSObject*, NSObject*, int64_t line) { return XQUnavailable(flwor, line); }
+NSObject* XQOrderSpec(NSObject*, NSObject*, int64_t line) {
+  return XQUnavailable(flwor, line);
+}
 
 NSObject* XQOrderModifier(bool, XQueryEmptyOrder, NSObject*, int64_t line) {
   return XQUnavailable(flwor, line);
 }
 
-NSObject* XQSome(NSObject*, NSObject*, int64_t line) { return XQUnavailable(quantified, line); }
+NSObject* XQSome(NSObject*, NSObject*, int64_t line) {
+  return XQUnavailable(quantified, line);
+}
 
-NSObject* XQEvery(NSObject*, NSObject*, int64_t line) { return XQUnavailable(quantified, line); }
+NSObject* XQEvery(NSObject*, NSObject*, int64_t line) {
+  return XQUnavailable(quantified, line);
+}
 
 NSObject* XQQuantifiedExprItem(NSObject*, NSObject*, NSObject*, int64_t line) {
   return XQUnavailable(quantified, line);
 }
 
-NSObject* XQQuantifiedExprItems(NSObject* item) { return XQList(item); }
+NSObject* XQQuantifiedExprItems(NSObject* item) {
+  return XQList(item);
+}
 
 NSObject* XQQuantifiedExprItemsAdd(NSObject* items, NSObject* item) {
   return XQListAdd(items, item);
@@ -134,7 +154,9 @@ NSObject* XQCaseClause(NSObject*, NSObject*, NSObject*, int64_t line) {
   return XQUnavailable(typeswitch, line);
 }
 
-NSObject* XQCaseClauses(NSObject* clause) { return XQList(clause); }
+NSObject* XQCaseClauses(NSObject* clause) {
+  return XQList(clause);
+}
 
 NSObject* XQCaseClausesAdd(NSObject* clauses, NSObject* clause) {
   return XQListAdd(clauses, clause);
@@ -176,7 +198,9 @@ NSObject* XQCastExpr(NSObject*, NSObject*, int64_t line) {
 }
 
 // The context item is one shared object and carries no line.
-NSObject* XQContextExpr() { return XQueryContextItem::contextItem(); }
+NSObject* XQContextExpr() {
+  return XQueryContextItem::contextItem();
+}
 
 NSObject* XQVarNameReference(NSObject* name, int64_t line) {
   return XQAtLine(XQueryVariable::variableWithName(XQRef<NSString>(name)), line);
@@ -219,15 +243,25 @@ NSObject* XQFunctionArgsAdd(NSObject* args, NSObject* expr) {
   return args;
 }
 
-NSObject* XQValidateExpr() { return nullptr; }
+NSObject* XQValidateExpr() {
+  return nullptr;
+}
 
-NSObject* XQOperatorLeft(NSObject* expr) { return cast<XQueryOperatorExpr>(expr)->left(); }
+NSObject* XQOperatorLeft(NSObject* expr) {
+  return cast<XQueryOperatorExpr>(expr)->left();
+}
 
-NSObject* XQOperatorRight(NSObject* expr) { return cast<XQueryOperatorExpr>(expr)->right(); }
+NSObject* XQOperatorRight(NSObject* expr) {
+  return cast<XQueryOperatorExpr>(expr)->right();
+}
 
-int XQOperatorType(NSObject* expr) { return cast<XQueryOperatorExpr>(expr)->operatorType(); }
+int XQOperatorType(NSObject* expr) {
+  return cast<XQueryOperatorExpr>(expr)->operatorType();
+}
 
-int64_t XQExprLine(NSObject* expr) { return cast<XQueryExpr>(expr)->exprLine(); }
+int64_t XQExprLine(NSObject* expr) {
+  return cast<XQueryExpr>(expr)->exprLine();
+}
 
 NSObject* XQExprSetLine(NSObject* expr, int64_t line) {
   cast<XQueryExpr>(expr)->setExprLine(line);

@@ -53,13 +53,17 @@ NSObject* XQRelativePathItemSetPredicates(NSObject* step, NSObject* predicates) 
   return step;
 }
 
-NSObject* XQPredicates(NSObject* expr) { return XQList(expr); }
+NSObject* XQPredicates(NSObject* expr) {
+  return XQList(expr);
+}
 
 NSObject* XQPredicatesAdd(NSObject* predicates, NSObject* expr) {
   return XQListAdd(predicates, expr);
 }
 
-NSObject* XQueryFilterStepRoot() { return XQueryParserAutoRelease(XQueryRootStep::rootStep()); }
+NSObject* XQueryFilterStepRoot() {
+  return XQueryParserAutoRelease(XQueryRootStep::rootStep());
+}
 
 NSObject* XQFilterStep(NSObject* expr) {
   return XQueryParserAutoRelease(XQueryFilterStep::filterStepWithExpr(XQRef<XQueryExpr>(expr)));
@@ -74,9 +78,13 @@ NSObject* XQNameTest(NSObject* name, int64_t line) {
   return XQAtLine(XQueryNameTest::nameTest(XQRef<NSString>(name)), line);
 }
 
-NSObject* XQNodeName(NSObject* name, int64_t line) { return XQNameTest(name, line); }
+NSObject* XQNodeName(NSObject* name, int64_t line) {
+  return XQNameTest(name, line);
+}
 
-NSObject* XQLocalName(NSObject* name, int64_t line) { return XQNameTest(name, line); }
+NSObject* XQLocalName(NSObject* name, int64_t line) {
+  return XQNameTest(name, line);
+}
 
 NSObject* XQWildCardNameTest(NSObject* prefix, NSObject* localName, int64_t line) {
   return XQAtLine(

@@ -23,7 +23,9 @@ NSObject* XQLibraryModule(NSObject* version, NSObject* moduleNamespace, NSObject
       std::move(items), nullptr, XQRef<NSString>(version)));
 }
 
-NSObject* XQVersion(NSObject* version) { return version; }
+NSObject* XQVersion(NSObject* version) {
+  return version;
+}
 
 NSObject* XQModuleNamespace(NSObject* prefix, NSObject* URI, int64_t line) {
   return XQueryParserAutoRelease(XQueryPrologItemModuleNamespace::moduleNamespace(
@@ -35,7 +37,9 @@ NSObject* XQProlog(NSObject* setters, NSObject* nonSetters) {
   return XQListAddAll(XQListAddAll(items, setters), nonSetters);
 }
 
-NSObject* XQPrologItems(NSObject* item) { return XQList(item); }
+NSObject* XQPrologItems(NSObject* item) {
+  return XQList(item);
+}
 
 NSObject* XQPrologItemsAppend(NSObject* items, NSObject* itemOrItems) {
   return XQListAddAll(items, itemOrItems);
@@ -120,20 +124,25 @@ NSObject* XQSchemaImportDefaultElement(NSObject* URI, NSObject* locations, int64
       XQRef<NSString>(URI), locationsOf(locations), line));
 }
 
-NSObject* XQImportList(NSObject* location) { return XQList(location); }
+NSObject* XQImportList(NSObject* location) {
+  return XQList(location);
+}
 
 NSObject* XQImportListAdd(NSObject* locations, NSObject* locationOrLocations) {
   return XQListAddAll(locations, locationOrLocations);
 }
 
 NSObject* XQParam(NSObject* name, NSObject* type, int64_t line) {
-  return XQAtLine(XQueryParam::paramWithName(XQRef<NSString>(name),
-                                             XQRef<XQueryTypeDeclaration>(type)),
-                  line);
+  return XQAtLine(
+      XQueryParam::paramWithName(XQRef<NSString>(name), XQRef<XQueryTypeDeclaration>(type)), line);
 }
 
-NSObject* XQParamList(NSObject* param) { return XQList(param); }
+NSObject* XQParamList(NSObject* param) {
+  return XQList(param);
+}
 
-NSObject* XQParamListAdd(NSObject* params, NSObject* param) { return XQListAdd(params, param); }
+NSObject* XQParamListAdd(NSObject* params, NSObject* param) {
+  return XQListAdd(params, param);
+}
 
 }  // namespace xquery

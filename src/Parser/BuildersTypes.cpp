@@ -16,13 +16,21 @@ NSObject* withOccurrence(NSObject* type, int token) {
 
 }  // namespace
 
-NSObject* XQNodeNameWildCard() { return nullptr; }
+NSObject* XQNodeNameWildCard() {
+  return nullptr;
+}
 
-NSObject* XQTypeName(NSObject* name) { return name; }
+NSObject* XQTypeName(NSObject* name) {
+  return name;
+}
 
-NSObject* XQTypeNameWildCard() { return nullptr; }
+NSObject* XQTypeNameWildCard() {
+  return nullptr;
+}
 
-NSObject* XQAnyKindTest(int64_t line) { return XQAtLine(XQueryTypeDeclaration::anyKind(), line); }
+NSObject* XQAnyKindTest(int64_t line) {
+  return XQAtLine(XQueryTypeDeclaration::anyKind(), line);
+}
 
 NSObject* XQElementTest(NSObject* name, NSObject*, bool, int64_t line) {
   return XQAtLine(XQueryTypeDeclaration::element(Value(name)), line);
@@ -40,15 +48,21 @@ NSObject* XQDocumentTest(NSObject* elementTest, int64_t line) {
   return XQAtLine(XQueryTypeDeclaration::document(XQRef<XQueryTypeDeclaration>(elementTest)), line);
 }
 
-NSObject* XQCommentTest(int64_t line) { return XQAtLine(XQueryTypeDeclaration::comment(), line); }
+NSObject* XQCommentTest(int64_t line) {
+  return XQAtLine(XQueryTypeDeclaration::comment(), line);
+}
 
-NSObject* XQTextTest(int64_t line) { return XQAtLine(XQueryTypeDeclaration::text(), line); }
+NSObject* XQTextTest(int64_t line) {
+  return XQAtLine(XQueryTypeDeclaration::text(), line);
+}
 
 NSObject* XQAtomicType(NSObject* name, int64_t line) {
   return XQAtLine(XQueryTypeDeclaration::atomic(XQRef<NSString>(name)), line);
 }
 
-NSObject* XQAnyItemType(int64_t line) { return XQAtLine(XQueryTypeDeclaration::item(), line); }
+NSObject* XQAnyItemType(int64_t line) {
+  return XQAtLine(XQueryTypeDeclaration::item(), line);
+}
 
 NSObject* XQSequenceTypeEmpty(int64_t line) {
   return XQAtLine(XQueryTypeDeclaration::empty(), line);

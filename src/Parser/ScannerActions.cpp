@@ -110,16 +110,22 @@ constexpr NameRule nameRules[] = {
 };
 
 XQueryScannedWord scanName(std::string_view rest) {
-  const auto* rule = std::find_if(std::begin(nameRules), std::end(nameRules), [](const auto& row) {
-    return row.state == sXQueryScannerState;
-  });
+  const auto* rule = std::find_if(std::begin(nameRules), std::end(nameRules),
+                                  [](const auto& row) { return row.state == sXQueryScannerState; });
   if (rule == std::end(nameRules)) return {};
   size_t length = 0;
   switch (rule->shape) {
-    case NameShape::None: break;
-    case NameShape::NCName: length = XQueryNCNameLength(rest); break;
-    case NameShape::QName: length = XQueryQNameLength(rest); break;
-    case NameShape::Name: length = XQueryNameLength(rest); break;
+    case NameShape::None:
+      break;
+    case NameShape::NCName:
+      length = XQueryNCNameLength(rest);
+      break;
+    case NameShape::QName:
+      length = XQueryQNameLength(rest);
+      break;
+    case NameShape::Name:
+      length = XQueryNameLength(rest);
+      break;
   }
   const std::string_view name = rest.substr(0, length);
   if (rule->token == kTokenPITarget && isReservedTarget(name)) return {};
@@ -209,11 +215,20 @@ int XQInvalidToken() {
   message += ')';
   switch (sXQueryScannerState) {
     case XQueryStateSTRING_LITERAL_QUOTE:
-    case XQueryStateSTRING_LITERAL_APOS: message += " in string literal"; break;
-    case XQueryStateXMLSPACE_DECL: message += " expected (preserve or strip)"; break;
-    case XQueryStateEXT_CONTENT: message += " expected extension"; break;
-    case XQueryStatePRAG_CONTENT: message += " expected pragma"; break;
-    default: break;
+    case XQueryStateSTRING_LITERAL_APOS:
+      message += " in string literal";
+      break;
+    case XQueryStateXMLSPACE_DECL:
+      message += " expected (preserve or strip)";
+      break;
+    case XQueryStateEXT_CONTENT:
+      message += " expected extension";
+      break;
+    case XQueryStatePRAG_CONTENT:
+      message += " expected pragma";
+      break;
+    default:
+      break;
   }
   return errorToken(message, XQlineno);
 }
@@ -230,7 +245,8 @@ int XQEndOfInput() {
     case XQueryStateSTRING_LITERAL_QUOTE:
     case XQueryStateSTRING_LITERAL_APOS:
       return errorToken("String not terminated ", sXQueryScannerStringLiteralLineNo);
-    default: return SetTokenValues(0, XQlineno, nullptr, {});
+    default:
+      return SetTokenValues(0, XQlineno, nullptr, {});
   }
 }
 

@@ -2,13 +2,13 @@
 // more than one symbol and one next state. For XQueryScanner.l only.
 #pragma once
 
+#include "Parser/XQueryScanner.h"
+#include "xquery/String.h"
+
 #include <cstdint>
 #include <string>
 #include <string_view>
 #include <vector>
-
-#include "Parser/XQueryScanner.h"
-#include "xquery/String.h"
 
 namespace xquery {
 

@@ -64,8 +64,10 @@ bool XQTokenIsCharacter(int token) {
     case kTokenElementContentChar:
     case kTokenElementContentCharWS:
     case kTokenPredefinedEntityRef:
-    case kTokenQuoteAttContentChar: return true;
-    default: return false;
+    case kTokenQuoteAttContentChar:
+      return true;
+    default:
+      return false;
   }
 }
 
@@ -74,8 +76,8 @@ void XQLexTokenLog(const XQueryTokenValue& value) {
   std::string line = std::string("token:") + XQTokenName(token) + "(" + std::to_string(token) +
                      ") line:" + std::to_string(value.line) + " value:";
   // The doubled braces have always been printed as text although they are characters.
-  const bool asText = token == kTokenCurlyBraceLeftCurlyBraceLeft ||
-                      token == kTokenCurlyBraceRightCurlyBraceRight;
+  const bool asText =
+      token == kTokenCurlyBraceLeftCurlyBraceLeft || token == kTokenCurlyBraceRightCurlyBraceRight;
   if (!XQTokenIsCharacter(token)) {
     line += textOf(value.value);
   } else if (asText) {

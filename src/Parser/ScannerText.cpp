@@ -50,11 +50,16 @@ char16_t CharRefToUnicode(std::string_view text) {
 
 char16_t PredefinedEntityToUnicode(std::string_view text) {
   switch (text.size() > 1 ? text[1] : '\0') {
-    case 'a': return text.size() > 2 && text[2] == 'm' ? u'&' : u'\'';
-    case 'g': return u'>';
-    case 'l': return u'<';
-    case 'q': return u'"';
-    default: return 0;
+    case 'a':
+      return text.size() > 2 && text[2] == 'm' ? u'&' : u'\'';
+    case 'g':
+      return u'>';
+    case 'l':
+      return u'<';
+    case 'q':
+      return u'"';
+    default:
+      return 0;
   }
 }
 

@@ -1,12 +1,12 @@
 // What a parse yields: the prolog items in source order, the body and the version.
 #pragma once
 
-#include <vector>
-
 #include "Expr/XQueryExpr.h"
 #include "Prolog/XQueryPrologItems.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
+
+#include <vector>
 
 namespace xquery {
 

@@ -73,7 +73,9 @@ Ref<XQueryParser> XQueryParser::parserWithSource(Ref<NSString> source) {
   return parser;
 }
 
-XQueryParser* XQueryParser::currentParser() { return sXQueryParserCurrent; }
+XQueryParser* XQueryParser::currentParser() {
+  return sXQueryParserCurrent;
+}
 
 void XQueryParser::parse() {
   const Session session(*this);
@@ -150,7 +152,9 @@ NSString* XQueryParserSting(std::string_view bytes) {
   return XQueryParserAutoRelease(NSString::stringWithUTF8(bytes));
 }
 
-void* XQueryParserAllocate(size_t size) { return sXQueryParserCurrent->allocate(size); }
+void* XQueryParserAllocate(size_t size) {
+  return sXQueryParserCurrent->allocate(size);
+}
 
 void XQerror(const char* message) {
   std::string text = message;
@@ -171,8 +175,8 @@ void XQueryFatalError(const char* message) {
 }
 
 void XQueryParserExtension(const Ref<NSString>& name, const Ref<NSString>& content, int64_t line) {
-  const std::string text = "must-understand extension not supported (" + name->utf8() + " " +
-                           content->utf8() + ")";
+  const std::string text =
+      "must-understand extension not supported (" + name->utf8() + " " + content->utf8() + ")";
   record(XQueryError::error(14, text, line), text);
 }
 

@@ -7,6 +7,11 @@
 // leaves its objects in an autorelease pool.
 #pragma once
 
+#include "Parser/XQueryParsedModule.h"
+#include "xquery/Error.h"
+#include "xquery/Object.h"
+#include "xquery/String.h"
+
 #include <cstdint>
 #include <memory>
 #include <mutex>
@@ -14,11 +19,6 @@
 #include <string_view>
 #include <utility>
 #include <vector>
-
-#include "Parser/XQueryParsedModule.h"
-#include "xquery/Error.h"
-#include "xquery/Object.h"
-#include "xquery/String.h"
 
 namespace xquery {
 
@@ -101,7 +101,8 @@ class XQueryParser : public NSCounted {
 // The value of the last grammar run; owned by the current parser's pool.
 extern NSObject* yyparse_result;
 
-// --- what the scanner and the grammar call; each works on the current parser -----------------------
+// --- what the scanner and the grammar call; each works on the current parser
+// -----------------------
 
 size_t XQueryParserReadChars(char* buffer, size_t maxBytes);
 // A string owned by the parser's pool. The name lacks its "r".

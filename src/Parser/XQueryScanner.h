@@ -7,11 +7,11 @@
 // All state is global. It is valid only while a parser is the current one.
 #pragma once
 
-#include <cstdint>
-#include <string_view>
-
 #include "Parser/XQueryTokenValue.h"
 #include "xquery/String.h"
+
+#include <cstdint>
+#include <string_view>
 
 // The current line, counted from 0.
 extern int XQlineno;
@@ -22,22 +22,23 @@ int XQlex();
 namespace xquery {
 
 // In the order of their numbers.
-#define XQUERY_SCANNER_STATES(STATE)                                                           \
-  STATE(INITIAL)                                                                               \
-  STATE(DEFAULT) STATE(OPERATOR) STATE(NAMESPACEDECL) STATE(NAMESPACEKEYWORD)                  \
-  STATE(XMLSPACE_DECL) STATE(ITEMTYPE) STATE(SINGLETYPE) STATE(KINDTEST) STATE(KINDTESTFORPI)  \
-  STATE(VARNAME) STATE(START_TAG) STATE(END_TAG) STATE(XML_COMMENT)                            \
-  STATE(PROCESSING_INSTRUCTION) STATE(PROCESSING_INSTRUCTION_CONTENT) STATE(CDATA_SECTION)     \
-  STATE(ELEMENT_CONTENT) STATE(QUOT_ATTRIBUTE_CONTENT) STATE(APOS_ATTRIBUTE_CONTENT)           \
-  STATE(EXPR_COMMENT) STATE(EXT_KEY) STATE(EXT_NAME) STATE(PRAG_NAME) STATE(EXT_CONTENT)       \
-  STATE(PRAG_CONTENT) STATE(OCCURRENCEINDICATOR) STATE(CLOSEKINDTEST)                          \
-  STATE(STRING_LITERAL_QUOTE) STATE(STRING_LITERAL_APOS)
+#define XQUERY_SCANNER_STATES(STATE)                                                              \
+  STATE(INITIAL)                                                                                  \
+  STATE(DEFAULT)                                                                                  \
+  STATE(OPERATOR) STATE(NAMESPACEDECL) STATE(NAMESPACEKEYWORD) STATE(XMLSPACE_DECL)               \
+      STATE(ITEMTYPE) STATE(SINGLETYPE) STATE(KINDTEST) STATE(KINDTESTFORPI) STATE(VARNAME)       \
+          STATE(START_TAG) STATE(END_TAG) STATE(XML_COMMENT) STATE(PROCESSING_INSTRUCTION)        \
+              STATE(PROCESSING_INSTRUCTION_CONTENT) STATE(CDATA_SECTION) STATE(ELEMENT_CONTENT)   \
+                  STATE(QUOT_ATTRIBUTE_CONTENT) STATE(APOS_ATTRIBUTE_CONTENT) STATE(EXPR_COMMENT) \
+                      STATE(EXT_KEY) STATE(EXT_NAME) STATE(PRAG_NAME) STATE(EXT_CONTENT)          \
+                          STATE(PRAG_CONTENT) STATE(OCCURRENCEINDICATOR) STATE(CLOSEKINDTEST)     \
+                              STATE(STRING_LITERAL_QUOTE) STATE(STRING_LITERAL_APOS)
 
 enum XQueryScannerState : int {
 #define XQUERY_ENUMERATOR(name) XQueryState##name,
   XQUERY_SCANNER_STATES(XQUERY_ENUMERATOR)
 #undef XQUERY_ENUMERATOR
-  XQueryStateCount
+      XQueryStateCount
 };
 
 // Clears everything; the first character is scanned in `startState`. The input is that of the
@@ -63,7 +64,8 @@ int SetTokenValues(int token, int line, char16_t unit, std::string_view text);
 // The text of the current token; empty at the end of the input.
 std::string_view XQScannerTokenText();
 
-// --- character conversions -------------------------------------------------------------------------
+// --- character conversions
+// -------------------------------------------------------------------------
 
 // "&#65;" and "&#x41;"; 0 for an empty reference and for a character outside the BMP, which these
 // references are knowingly too narrow for.
@@ -77,7 +79,8 @@ int UniCodeToUTF8(char16_t codeUnit, char* out);
 // The whole text, decoded.
 void XQAppendUTF8(NSMutableString& to, std::string_view bytes);
 
-// --- logging ---------------------------------------------------------------------------------------
+// --- logging
+// ---------------------------------------------------------------------------------------
 
 // Switched by the environment at the first scan of the process.
 extern bool sXQueryLogTokens;

@@ -6,9 +6,9 @@
 // drained at the end of the parse.
 #pragma once
 
-#include <cstdint>
-
 #include "xquery/Object.h"
+
+#include <cstdint>
 
 namespace xquery {
 

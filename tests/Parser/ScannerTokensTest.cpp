@@ -1,7 +1,7 @@
 // Every token of the list, in a state that yields it, with the state and the stack after it.
-#include <gtest/gtest.h>
-
 #include "Parser/ScannerHarness.h"
+
+#include <gtest/gtest.h>
 
 #include <ostream>
 #include <set>
@@ -35,8 +35,8 @@ struct Row {
   int state;         // the state that the text is scanned in
   const char* text;  // its first token is looked at
   int token;
-  const char* value;  // the token's value; a character token's as text
-  int next;           // the state after it
+  const char* value;              // the token's value; a character token's as text
+  int next;                       // the state after it
   std::vector<int> stack = {EC};  // after it; before it the stack holds one ELEMENT_CONTENT
 };
 
@@ -325,8 +325,9 @@ TEST(ScannerTokens, EveryTokenIsScannedButTheNineThatNoQueryYields) {
   EXPECT_EQ(missing.size(), 178u);
   for (const Row& row : rows) missing.erase(XQTokenName(row.token));
   const std::set<std::string> expected = {
-      "kTokenContext", "kTokenElementWS", "kTokenError",  "kTokenLax", "kTokenNillable",
-      "kTokenNo",      "kTokenQNameSolidus", "kTokenStrict", "kTokenValidateContext", "kTokenYes"};
+      "kTokenContext",         "kTokenElementWS", "kTokenError",        "kTokenLax",
+      "kTokenNillable",        "kTokenNo",        "kTokenQNameSolidus", "kTokenStrict",
+      "kTokenValidateContext", "kTokenYes"};
   EXPECT_EQ(missing, expected);
   EXPECT_EQ(Scanned("#").tokens.front().code, kTokenError);
 }
