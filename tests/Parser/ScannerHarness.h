@@ -6,6 +6,8 @@
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
 
+#include <gtest/gtest.h>
+
 #include <cstdint>
 #include <string>
 #include <string_view>
