@@ -1,0 +1,42 @@
+#include "Eval/XQueryInternal.h"
+
+#include "Parser/XQueryParsedModule.h"
+#include "Parser/XQueryParser.h"
+#include "Prolog/XQueryModules.h"
+#include "Prolog/XQueryProlog.h"
+#include "Prolog/XQueryPrologItems.h"
+
+namespace xquery {
+
+XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource) {
+  const auto parser = XQueryParser::parserWithSource(initWithSource);
+  _errors = parser->errors();
+  if (!_errors.empty()) return;
+
+  // An empty query has no module: no prolog items and no body.
+  std::vector<Ref<XQueryPrologItem>> items;
+  Ref<NSString> version;
+  if (const auto& module = parser->parsedModule()) {
+    items = module->prologItems();
+    version = module->version();
+    _body = module->body();
+  }
+  _prolog = XQueryProlog::prologWithItems(items, nullptr, nullptr, version);
+  // Local variable IDs of the main body start at 1.
+  _prolog->setNextLocalVariableID(1);
+  if (_body) _body->bindInfoForProlog(*_prolog);
+  _errors = _prolog->errors();
+}
+
+XQueryInternal::XQueryInternal(Ref<XQueryError> error) : _errors{std::move(error)} {}
+
+XQueryInternal::XQueryInternal(Ref<XQueryProlog> prolog, Ref<XQueryExpr> body)
+    : _prolog(std::move(prolog)), _body(std::move(body)), _errors(_prolog->errors()) {}
+
+XQueryInternal::~XQueryInternal() = default;
+
+XQueryProlog* XQueryInternal::prolog() const { return _prolog.get(); }
+
+XQueryExpr* XQueryInternal::body() const { return _body.get(); }
+
+}  // namespace xquery
