@@ -50,9 +50,18 @@ Int128 wideMagnitude(int64_t value) {
   return value < 0 ? -Int128{value} : Int128{value};
 }
 
-// Whether a magnitude is changed by one away from zero after truncation. `half` compares what was
-// cut off with a half; `odd` is about the truncated value.
-bool roundsAway(NSRoundingMode mode, bool negative, int half, bool odd) {
+// What truncation cut off, compared with half a unit of what is left.
+enum class CutOff : uint8_t { Nothing, BelowHalf, Half, AboveHalf };
+
+CutOff cutOff(int comparedWithHalf) {
+  return comparedWithHalf < 0   ? CutOff::BelowHalf
+         : comparedWithHalf > 0 ? CutOff::AboveHalf
+                                : CutOff::Half;
+}
+
+// Whether the truncated magnitude grows by one; `odd` is about that magnitude.
+bool roundsAway(NSRoundingMode mode, bool negative, CutOff cut, bool odd) {
+  if (cut == CutOff::Nothing) return false;
   switch (mode) {
     case NSRoundingMode::TowardZero:
       return false;
@@ -61,11 +70,11 @@ bool roundsAway(NSRoundingMode mode, bool negative, int half, bool odd) {
     case NSRoundingMode::Ceiling:
       return !negative;
     case NSRoundingMode::HalfAwayFromZero:
-      return half >= 0;
+      return cut >= CutOff::Half;
     case NSRoundingMode::HalfUp:
-      return half > 0 || (half == 0 && !negative);
+      return negative ? cut > CutOff::Half : cut >= CutOff::Half;
     case NSRoundingMode::HalfEven:
-      return half > 0 || (half == 0 && odd);
+      return odd ? cut >= CutOff::Half : cut > CutOff::Half;
   }
   return false;
 }
@@ -433,19 +442,16 @@ NSDecimal NSDecimalArithmetic::roundSmall(const NSDecimal& value, int64_t drop, 
   const bool negative = value._coefficient < 0;
   const Int128 magnitude = wideMagnitude(value._coefficient);
   Int128 quotient = 0;
-  int half = -1;
+  CutOff cut = CutOff::BelowHalf;
   // Twenty digits and more exceed twice every 64-bit coefficient.
   if (drop < 20) {
     const Int128 power =
         drop <= maximumSmallPower ? Int128{smallPowers[drop]} : Int128{smallPowers[drop - 1]} * 10;
     quotient = magnitude / power;
     const Int128 twice = (magnitude % power) * 2;
-    if (twice == 0)
-      half = -2;  // nothing is cut off
-    else
-      half = twice < power ? -1 : twice > power ? 1 : 0;
+    cut = twice == 0 ? CutOff::Nothing : cutOff(twice < power ? -1 : twice > power ? 1 : 0);
   }
-  if (half != -2 && roundsAway(mode, negative, half, quotient % 2 != 0)) ++quotient;
+  if (roundsAway(mode, negative, cut, quotient % 2 != 0)) ++quotient;
   const auto result = static_cast<int64_t>(negative ? -quotient : quotient);
   return scale >= 0 ? small(result, scale) : big(BigInteger(result), scale);
 }
@@ -455,20 +461,17 @@ NSDecimal NSDecimalArithmetic::roundBig(const NSDecimal& value, int64_t drop, in
   BigInteger quotient = *value._big;
   const bool negative = quotient.sign() < 0;
   if (negative) quotient.negate();
-  int half = -1;
+  CutOff cut = CutOff::BelowHalf;
   if (drop > static_cast<int64_t>(quotient.digitsAtMost())) {
     quotient = BigInteger();
   } else {
     const BigInteger power = BigInteger::powerOfTen(static_cast<uint32_t>(drop));
     BigInteger remainder = quotient.divide(power);
-    if (remainder.sign() == 0)
-      half = -2;  // nothing is cut off
-    else {
-      remainder.add(BigInteger(remainder));
-      half = remainder.compare(power);
-    }
+    const bool exact = remainder.sign() == 0;
+    remainder.add(BigInteger(remainder));
+    cut = exact ? CutOff::Nothing : cutOff(remainder.compare(power));
   }
-  if (half != -2 && roundsAway(mode, negative, half, quotient.isOdd())) {
+  if (roundsAway(mode, negative, cut, quotient.isOdd())) {
     quotient.add(BigInteger(int64_t{1}));
   }
   if (negative) quotient.negate();
