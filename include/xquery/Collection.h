@@ -1,9 +1,9 @@
 // Arrays and the shared null object.
 #pragma once
 
-#include <vector>
-
 #include "xquery/Object.h"
+
+#include <vector>
 
 namespace xquery {
 

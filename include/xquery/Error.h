@@ -2,12 +2,12 @@
 // as an NSException, which never leaves the public interface.
 #pragma once
 
+#include "xquery/Object.h"
+#include "xquery/String.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
-
-#include "xquery/Object.h"
-#include "xquery/String.h"
 
 namespace xquery {
 

@@ -14,7 +14,7 @@ class XQUERY_EXPORT NSURL : public NSCounted {
   // Absolute or relative, the empty text included. Null when the text holds a character or a form
   // that RFC 3986 does not allow.
   [[nodiscard]] static Ref<NSURL> URLWithString(const Ref<NSString>& text);
-  // RFC 3986 section 5 resolution against an absolute base. Null when either does not parse.
+  // RFC 3986 resolution against an absolute base. Null when either does not parse.
   [[nodiscard]] static Ref<NSURL> URLWithString(const Ref<NSString>& text, const NSURL& base);
 
   // The text as given (for a resolved reference: the resolved text).

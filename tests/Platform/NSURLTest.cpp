@@ -59,7 +59,7 @@ TEST(URL, CharactersAndFormsOutsideTheGrammarAreRejected) {
   EXPECT_FALSE(NSURL::URLWithString(Ref<NSString>()));
 }
 
-// The examples of RFC 3986, sections 5.4.1 and 5.4.2.
+// The normal and abnormal examples that RFC 3986 gives.
 TEST(URL, ResolutionFollowsTheExamplesOfTheStandard) {
   struct Row {
     const char* reference;
