@@ -218,12 +218,19 @@ TEST_F(Driver, ContextItemOutlivesItsHolder) {
   EXPECT_EQ(strings(evaluate("a")), "t");
 }
 
-TEST_F(Driver, WithoutAContextItemThereIsNone) {
-  EXPECT_FALSE(evaluate("."));
-  EXPECT_FALSE(error);
-  EXPECT_FALSE(evaluate("a"));
+TEST_F(Driver, WithoutAContextItemDotAndRelativePathsAreEmpty) {
+  for (const char* source : {".", "a", "@a", "a/b[1]"}) {
+    const auto items = evaluate(source);
+    ASSERT_TRUE(items) << source;
+    EXPECT_EQ(items->count(), 0U) << source;
+  }
+}
+
+TEST_F(Driver, WithoutAContextItemAnAbsolutePathFails) {
+  EXPECT_FALSE(evaluate("/a"));
   ASSERT_TRUE(error);
   EXPECT_EQ(error->err(), 20);
+  EXPECT_EQ(error->msg()->utf8(), "context item not a node");
 }
 
 TEST_F(Driver, RunTimeErrorComesWithNumberMessageAndLine) {

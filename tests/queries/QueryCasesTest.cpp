@@ -169,7 +169,7 @@ void registerCases(const std::filesystem::path& folder) {
 }
 
 const bool registered = [] {
-  registerCases(std::filesystem::path(__FILE__).parent_path() / "cases");
+  registerCases(std::filesystem::path(XQUERY_SOURCE_DIR) / "tests/queries/cases");
   return true;
 }();
 
