@@ -35,7 +35,10 @@ class Parse {
   void failAt(const char* message, int64_t line, int64_t column);
   void note(const char* message, int64_t line, int64_t column);  // the first failure counts
   bool hasReadAll();
-  bool mayExpand(size_t bytes);
+  bool isTagTooLong() const;
+  bool mayAdd(size_t bytes);
+  bool mayAddDefaults(const LibXMLNamespaces& namespaces, const LibXMLAttributes& attributes,
+                      int defaultedCount);
   // Comments and instructions of the internal subset are no nodes of the document.
   bool isInsideDTD() const { return _parser->inSubset != 0; }
 
@@ -66,12 +69,14 @@ class Parse {
   NSXMLParseError& _error;
   xmlParserCtxt* _parser = nullptr;
   size_t _bytesRead = 0;
-  size_t _bytesExpanded = 0;
+  size_t _bytesAdded = 0;
+  int _namespaceEntries = 0;  // of the parser's, before the tag at hand
   bool _reachedEnd = false;
   bool _failed = false;
 };
 
 constexpr const char* outOfMemory = "out of memory";
+constexpr const char* tooMuchText = "entities expand to too much text";
 
 std::string_view viewOf(const xmlChar* text, size_t length) {
   return {reinterpret_cast<const char*>(text), length};
@@ -140,9 +145,21 @@ int Parse::readInput(void* self, char* buffer, int size) {
     parse.note("the input cannot be read", 0, 0);
     return 0;
   }
+  if (parse.isTagTooLong()) {
+    const xmlParserInput* input = parse._parser->input;
+    parse.note("too many attributes", input->line, input->col);
+    return 0;
+  }
   if (count == 0) parse._reachedEnd = true;
   parse._bytesRead += static_cast<size_t>(count);
   return static_cast<int>(count);
+}
+
+// Looked at whenever input is read, which is often within a long tag. The room for attributes is
+// five entries for each and doubles; namespaces are two entries each.
+bool Parse::isTagTooLong() const {
+  return _parser->maxatts > 2 * 5 * LibXMLMostAttributes ||
+         _parser->nsNr - _namespaceEntries > 2 * LibXMLMostAttributes;
 }
 
 // libxml2 takes a zero byte after the root element for the end of the input.
@@ -155,11 +172,20 @@ bool Parse::hasReadAll() {
 
 // --- entities --------------------------------------------------------------------------------
 
-bool Parse::mayExpand(size_t bytes) {
-  // What a reference costs apart from its text, so that empty entities are bounded too.
-  constexpr size_t costOfReference = 32;
-  _bytesExpanded += bytes + costOfReference;
-  return _bytesExpanded <= std::max(LibXMLEntityBytes, _bytesRead * LibXMLEntityFactor);
+bool Parse::mayAdd(size_t bytes) {
+  _bytesAdded += bytes;
+  return _bytesAdded <= std::max(LibXMLAddedBytes, _bytesRead * LibXMLAddedFactor);
+}
+
+// Attributes that the internal subset gives to an element come last. Declarations given in this way
+// cannot be told from those in the document, which are long enough never to reach the bound.
+bool Parse::mayAddDefaults(const LibXMLNamespaces& namespaces, const LibXMLAttributes& attributes,
+                           int defaultedCount) {
+  size_t bytes = static_cast<size_t>(namespaces.count() + defaultedCount) * LibXMLAttributeCost;
+  for (int index = attributes.count() - defaultedCount; index < attributes.count(); ++index) {
+    bytes += attributes.value(index).size();
+  }
+  return bytes == 0 || mayAdd(bytes);
 }
 
 xmlEntityPtr Parse::permitted(xmlEntityPtr entity) {
@@ -170,8 +196,8 @@ xmlEntityPtr Parse::permitted(xmlEntityPtr entity) {
     return nullptr;
   }
   if (entity->etype != XML_INTERNAL_PREDEFINED_ENTITY &&
-      !mayExpand(static_cast<size_t>(entity->length))) {
-    fail("entities expand to too much text");
+      !mayAdd(static_cast<size_t>(entity->length) + LibXMLReferenceCost)) {
+    fail(tooMuchText);
     return nullptr;
   }
   return entity;
@@ -217,12 +243,14 @@ void Parse::reference(void* self, const xmlChar*) {
 
 void Parse::startElement(void* self, const xmlChar* localName, const xmlChar* prefix,
                          const xmlChar* URI, int namespaceCount, const xmlChar** namespaces,
-                         int attributeCount, int, const xmlChar** attributes) {
+                         int attributeCount, int defaultedCount, const xmlChar** attributes) {
   Parse& parse = of(self);
+  const LibXMLNamespaces declared(namespaces, namespaceCount);
+  const LibXMLAttributes given(attributes, attributeCount);
+  parse._namespaceEntries = parse._parser->nsNr;
   parse.guarded([&] {
-    parse._handler.startElement({localName, prefix, URI},
-                                LibXMLNamespaces(namespaces, namespaceCount),
-                                LibXMLAttributes(attributes, attributeCount));
+    if (!parse.mayAddDefaults(declared, given, defaultedCount)) throw LibXMLStop{tooMuchText};
+    parse._handler.startElement({localName, prefix, URI}, declared, given);
   });
 }
 

@@ -76,11 +76,18 @@ struct LibXMLStop {
 // Fills the buffer; answers the number of bytes, 0 at the end of the input, negative on failure.
 using LibXMLReader = std::function<ptrdiff_t(char* buffer, size_t size)>;
 
-// What entities add to a document is at most the larger of these: an absolute number of bytes, and
-// a multiple of the bytes read so far. Each reference counts for the text of its entity and a few
-// bytes more.
-constexpr size_t LibXMLEntityBytes = size_t{10} << 20;
-constexpr size_t LibXMLEntityFactor = 20;
+// What entities and attribute defaults add to a document is at most the larger of these: an
+// absolute number of bytes, and a multiple of the bytes read so far. A reference counts for the
+// text of its entity and a little more, so that empty entities are bounded too; a default counts
+// for its value and a little more.
+constexpr size_t LibXMLAddedBytes = size_t{10} << 20;
+constexpr size_t LibXMLAddedFactor = 20;
+constexpr size_t LibXMLReferenceCost = 32;
+constexpr size_t LibXMLAttributeCost = 16;
+
+// libxml2 compares every attribute of a start tag with every other, and every declaration too, so
+// that a tag of a million would keep it busy for minutes. Somewhat more than this many are refused.
+constexpr int LibXMLMostAttributes = 45000;
 
 // Whether the document was well formed; else `error` says what is wrong, and where.
 bool parseWithLibXML(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error);

@@ -16,6 +16,7 @@
 #include <fcntl.h>
 #include <limits>
 #include <unistd.h>
+#include <unordered_map>
 #include <vector>
 
 namespace xquery {
@@ -23,6 +24,9 @@ namespace xquery {
 namespace {
 
 constexpr std::string_view whiteSpace = " \t\r\n";
+
+constexpr size_t mostUnits = std::numeric_limits<uint32_t>::max() - 1;
+constexpr const char* tooLong = "a text is too long";
 
 bool isASCII(std::string_view text) {
   uint64_t bits = 0;
@@ -175,6 +179,10 @@ class TreeHandler final : public LibXMLHandler {
   bool isPendingKept() const;
   void addText(bool isCDATA);
   void setText(NSXMLNode* node, std::string_view text);
+  // The text in the arena.
+  NSStringView stored(std::string_view text);
+  // The same, once for all declarations of one URI.
+  NSStringView storedURI(LibXMLText URI);
   void hearSpace(const LibXMLName& name, std::string_view value);
 
   bool _alwaysKeepsWhitespace;
@@ -182,25 +190,34 @@ class TreeHandler final : public LibXMLHandler {
   bool _keepsCDATA;
   NSXMLTreeBuilder _builder;
   NameCache _names;
+  std::unordered_map<LibXMLText, NSStringView> _URIs;
   std::vector<SpaceChange> _spaceChanges;
   std::string _pending;          // text not yet stored, UTF-8
   bool _pendingIsExact = false;  // some of it came from a CDATA section: kept whatever it is
 };
 
 void TreeHandler::setText(NSXMLNode* node, std::string_view text) {
-  constexpr size_t most = std::numeric_limits<uint32_t>::max();
-  if (isASCII(text)) {
-    if (text.size() >= most) throw LibXMLStop{"a text is too long"};
-    auto* units = static_cast<char*>(_builder.tree().allocateText(text.size()));
-    if (!text.empty()) std::memcpy(units, text.data(), text.size());
-    NSXMLTree::setStoredText(node, NSStringView(units, static_cast<uint32_t>(text.size())));
-    return;
+  NSXMLTree::setStoredText(node, stored(text));
+}
+
+NSStringView TreeHandler::stored(std::string_view text) {
+  const bool isNarrow = isASCII(text);
+  const size_t count = isNarrow ? text.size() : unitCount(text);
+  if (count > mostUnits) throw LibXMLStop{tooLong};
+  void* units = _builder.tree().allocateText(isNarrow ? count : count * sizeof(char16_t));
+  if (isNarrow) {
+    if (count) std::memcpy(units, text.data(), count);
+    return {static_cast<const char*>(units), static_cast<uint32_t>(count)};
   }
-  const size_t count = unitCount(text);
-  if (count >= most) throw LibXMLStop{"a text is too long"};
-  auto* units = static_cast<char16_t*>(_builder.tree().allocateText(count * sizeof(char16_t)));
-  widen(text, units);
-  NSXMLTree::setStoredText(node, NSStringView(units, static_cast<uint32_t>(count)));
+  widen(text, static_cast<char16_t*>(units));
+  return {static_cast<const char16_t*>(units), static_cast<uint32_t>(count)};
+}
+
+NSStringView TreeHandler::storedURI(LibXMLText URI) {
+  if (!URI) return {};
+  const auto [place, isNew] = _URIs.try_emplace(URI);
+  if (isNew) place->second = stored(reinterpret_cast<const char*>(URI));
+  return place->second;
 }
 
 bool TreeHandler::isPendingKept() const {
@@ -248,8 +265,8 @@ void TreeHandler::startElement(const LibXMLName& name, const LibXMLNamespaces& n
   for (int index = 0; index < namespaces.count(); ++index) {
     // A namespace node's name is its prefix, "" for the default namespace.
     const NSXMLName* prefix = _names.name({namespaces.prefix(index), nullptr, nullptr});
-    const auto* URI = reinterpret_cast<const char*>(namespaces.URI(index));
-    setText(_builder.addProperty(Kind::Namespace, prefix), URI ? URI : "");
+    NSXMLNode* declaration = _builder.addProperty(Kind::Namespace, prefix);
+    NSXMLTree::setStoredText(declaration, storedURI(namespaces.URI(index)));
   }
   for (int index = 0; index < attributes.count(); ++index) {
     const LibXMLName attribute = attributes.name(index);

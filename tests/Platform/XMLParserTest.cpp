@@ -332,7 +332,7 @@ std::string references(size_t count) {
 }
 
 TEST(XMLParser, TheBoundOfExpansionIsTenMebibytesForASmallDocument) {
-  const size_t most = LibXMLEntityBytes / 1024;
+  const size_t most = LibXMLAddedBytes / 1024;
   EXPECT_EQ(parsed(references(most - 1))->stringValue()->length(), (most - 1) * (1024 - 32));
   EXPECT_EQ(errorOf(references(most + 2)).message, "entities expand to too much text");
 }
@@ -342,6 +342,25 @@ TEST(XMLParser, ALargeDocumentMayExpandInProportion) {
   std::string text = references(12 * 1024);
   text.insert(text.find("<a>") + 3, std::string(1 << 20, 'y'));
   EXPECT_TRUE(parsed(text));
+}
+
+TEST(XMLParser, AttributeDefaultsAreBoundedToo) {
+  std::string text = "<!DOCTYPE a [<!ATTLIST b x CDATA '" + std::string(10000, 'x') + "'>]><a>";
+  for (int index = 0; index < 2000; ++index) text += "<b/>";
+  EXPECT_EQ(errorOf(text + "</a>").message, "entities expand to too much text");
+  text = "<!DOCTYPE a [<!ATTLIST b";
+  for (int index = 0; index < 2000; ++index) {
+    text += " xmlns:p" + std::to_string(index) + " CDATA 'u'";
+  }
+  text += ">]><a>";
+  for (int index = 0; index < 2000; ++index) text += "<b/>";
+  EXPECT_EQ(errorOf(text + "</a>").message, "entities expand to too much text");
+}
+
+TEST(XMLParser, DeclarationsInTheDocumentAreNeverTooMany) {
+  std::string text = "<a>";
+  for (int index = 0; index < 200000; ++index) text += "<b xmlns='u' x=''/>";
+  EXPECT_TRUE(parsed(text + "</a>"));
 }
 
 // --- depth and length --------------------------------------------------------------------------
@@ -362,6 +381,26 @@ TEST(XMLParser, DepthIsBoundedByMemoryOnly) {
   EXPECT_EQ(written, text);
   const Ref<NSXMLNode> copy = document->copy();
   EXPECT_EQ(copy->stringValue()->utf8(), "x");
+}
+
+std::string tagWith(int count, const char* name) {
+  std::string text = "<a";
+  for (int index = 0; index < count; ++index) text += name + std::to_string(index) + "='u'";
+  return text + "/>";
+}
+
+TEST(XMLParser, TheAttributesOfATagAreBounded) {
+  EXPECT_TRUE(parsed(tagWith(5000, " x")));
+  EXPECT_TRUE(parsed(tagWith(5000, " xmlns:x")));
+  EXPECT_EQ(errorOf(tagWith(150000, " x")).message, "too many attributes");
+  EXPECT_EQ(errorOf(tagWith(150000, " xmlns:x")).message, "too many attributes");
+}
+
+TEST(XMLParser, DeclarationsOfNestedTagsAreNotBounded) {
+  std::string text;
+  for (int depth = 0; depth < 100000; ++depth) text += "<a xmlns='u'>";
+  for (int depth = 0; depth < 100000; ++depth) text += "</a>";
+  EXPECT_TRUE(parsed(text));
 }
 
 TEST(XMLParser, TextsAndAttributesMayBeLong) {
