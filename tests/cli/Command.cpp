@@ -1,0 +1,95 @@
+#include "cli/Command.h"
+
+#include <cstdlib>
+#include <fcntl.h>
+#include <fstream>
+#include <iterator>
+#include <stdexcept>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace command {
+namespace {
+
+// In the child: standard streams, then the program.
+[[noreturn]] void become(const std::string& program, const std::vector<std::string>& arguments,
+                         int in, int out, int err) {
+  dup2(in, STDIN_FILENO);
+  dup2(out, STDOUT_FILENO);
+  dup2(err, STDERR_FILENO);
+  std::vector<char*> argv{const_cast<char*>(program.c_str())};
+  for (const std::string& argument : arguments) argv.push_back(const_cast<char*>(argument.c_str()));
+  argv.push_back(nullptr);
+  execv(program.c_str(), argv.data());
+  _exit(127);
+}
+
+int openFile(const std::string& path, int flags) {
+  const int file = open(path.c_str(), flags | O_CLOEXEC, 0600);
+  if (file < 0) throw std::runtime_error("cannot open " + path);
+  return file;
+}
+
+int closedPipe() {
+  int ends[2];
+  if (pipe2(ends, O_CLOEXEC) != 0) throw std::runtime_error("cannot make a pipe");
+  close(ends[0]);
+  return ends[1];
+}
+
+}  // namespace
+
+Outcome start(const std::string& program, const std::vector<std::string>& arguments,
+              const std::string& input, StandardOutput standardOutput) {
+  const TemporaryDirectory directory;
+  const std::string out = directory.path("out"), err = directory.path("err");
+  const int inFile = openFile(directory.write("in", input), O_RDONLY);
+  const int outFile = standardOutput == StandardOutput::ClosedPipe
+                          ? closedPipe()
+                          : openFile(out, O_WRONLY | O_CREAT);
+  const int errFile = openFile(err, O_WRONLY | O_CREAT);
+  const pid_t child = fork();
+  if (child == 0) {
+    become(std::string(XQUERY_BINARY_DIR "/") + program, arguments, inFile, outFile, errFile);
+  }
+  for (const int file : {inFile, outFile, errFile}) close(file);
+
+  Outcome outcome;
+  int status = 0;
+  waitpid(child, &status, 0);
+  outcome.status = WIFEXITED(status) ? WEXITSTATUS(status) : -WTERMSIG(status);
+  outcome.out = readFile(out);
+  outcome.err = readFile(err);
+  return outcome;
+}
+
+Outcome xquery(const std::vector<std::string>& arguments, const std::string& input) {
+  return start("xquery", arguments, input);
+}
+
+TemporaryDirectory::TemporaryDirectory() {
+  std::string name = (std::filesystem::temp_directory_path() / "xquery-test-XXXXXX").string();
+  if (!mkdtemp(name.data())) throw std::runtime_error("cannot make a directory");
+  _path = name;
+}
+
+TemporaryDirectory::~TemporaryDirectory() {
+  std::error_code ignored;
+  std::filesystem::remove_all(_path, ignored);
+}
+
+std::string TemporaryDirectory::write(const std::string& name, const std::string& text) const {
+  std::ofstream(_path / name, std::ios::binary) << text;
+  return path(name);
+}
+
+std::string readFile(const std::string& path) {
+  std::ifstream file(path, std::ios::binary);
+  return {std::istreambuf_iterator<char>(file), {}};
+}
+
+std::string books() {
+  return XQUERY_SOURCE_DIR "/examples/books.xml";
+}
+
+}  // namespace command

@@ -1,0 +1,47 @@
+// Runs the built command as a process.
+#pragma once
+
+#include <filesystem>
+#include <string>
+#include <vector>
+
+namespace command {
+
+struct Outcome {
+  int status = -1;  // the exit status; minus the signal's number when one ended the process
+  std::string out;
+  std::string err;
+};
+
+enum class StandardOutput { Captured, ClosedPipe };
+
+// Starts a program of the build directory with `input` as its standard input.
+Outcome start(const std::string& program, const std::vector<std::string>& arguments,
+              const std::string& input = "",
+              StandardOutput standardOutput = StandardOutput::Captured);
+
+// The xquery command.
+Outcome xquery(const std::vector<std::string>& arguments, const std::string& input = "");
+
+// A directory of its own for each object, removed with it.
+class TemporaryDirectory {
+ public:
+  TemporaryDirectory();
+  ~TemporaryDirectory();
+  TemporaryDirectory(const TemporaryDirectory&) = delete;
+  TemporaryDirectory& operator=(const TemporaryDirectory&) = delete;
+
+  std::string path(const std::string& name) const { return (_path / name).string(); }
+  // Writes a file and answers its path.
+  std::string write(const std::string& name, const std::string& text) const;
+
+ private:
+  std::filesystem::path _path;
+};
+
+std::string readFile(const std::string& path);
+
+// The document of the examples.
+std::string books();
+
+}  // namespace command

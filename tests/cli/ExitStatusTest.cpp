@@ -1,0 +1,197 @@
+#include "cli/Command.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+using command::books;
+using command::Outcome;
+using command::TemporaryDirectory;
+using command::xquery;
+using testing::ContainsRegex;
+using testing::HasSubstr;
+using testing::StartsWith;
+
+namespace {
+
+TEST(ExitStatus, AResultIsZero) {
+  const Outcome outcome = xquery({"-e", "1 + 1"});
+  EXPECT_EQ(outcome.status, 0);
+  EXPECT_EQ(outcome.out, "2\n");
+  EXPECT_EQ(outcome.err, "");
+}
+
+TEST(ExitStatus, AnEmptySequenceIsZeroAndPrintsNothing) {
+  const Outcome outcome = xquery({"-e", "()"});
+  EXPECT_EQ(outcome.status, 0);
+  EXPECT_EQ(outcome.out, "");
+}
+
+TEST(ExitStatus, AnEmptyQueryIsZeroAndPrintsNothing) {
+  const Outcome outcome = xquery({"-e", ""});
+  EXPECT_EQ(outcome.status, 0);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_EQ(outcome.err, "");
+}
+
+TEST(ExitStatus, AParseErrorIsOneWithItsLineAndNoOutput) {
+  const Outcome outcome = xquery({"-e", "1 +\n\n)"});
+  EXPECT_EQ(outcome.status, 1);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, StartsWith("XQueryError:"));
+  EXPECT_THAT(outcome.err, HasSubstr("line:3"));
+}
+
+TEST(ExitStatus, AnUnboundVariableIsOne) {
+  const Outcome outcome = xquery({"-e", "$nowhere"});
+  EXPECT_EQ(outcome.status, 1);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, StartsWith("XQueryError:"));
+}
+
+TEST(ExitStatus, AnErrorWhileEvaluatingIsOneWithNothingPrinted) {
+  const Outcome outcome = xquery({"-e", "(1, 2, 1 div 0)"});
+  EXPECT_EQ(outcome.status, 1);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, StartsWith("XQueryError:"));
+}
+
+TEST(ExitStatus, APathWithoutAContextItemIsOne) {
+  const Outcome outcome = xquery({"-e", "//book"});
+  EXPECT_EQ(outcome.status, 1);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, StartsWith("XQueryError:"));
+}
+
+// --- wrong usage
+// ----------------------------------------------------------------------------------
+
+struct WrongUsage {
+  const char* name;
+  std::vector<std::string> arguments;
+  const char* complaint;
+};
+
+class Usage : public testing::TestWithParam<WrongUsage> {};
+
+TEST_P(Usage, IsTwoWithAnExplanation) {
+  const Outcome outcome = xquery(GetParam().arguments);
+  EXPECT_EQ(outcome.status, 2);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, HasSubstr(GetParam().complaint));
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Wrong, Usage,
+    testing::Values(
+        WrongUsage{"UnknownOption", {"--bogus", "-e", "1"}, "--bogus"},
+        WrongUsage{"NoQuery", {}, "QUERYFILE"},
+        WrongUsage{"TooManyArguments", {"a.xq", "b.xml", "c"}, "c"},
+        WrongUsage{"TooManyArgumentsWithText", {"-e", "1", "b.xml", "c"}, "c"},
+        WrongUsage{"TextWithoutText", {"-e"}, "-e"},
+        WrongUsage{"TextTwice", {"-e", "1", "-e", "2"}, "-e"},
+        WrongUsage{"VariableWithoutValue", {"--var", "x", "-e", "1"}, "--var"},
+        WrongUsage{"VariableWithoutName", {"--var", "=x", "-e", "1"}, "--var"},
+        WrongUsage{"DocumentWithoutFile", {"--doc", "d", "-e", "1"}, "--doc"},
+        WrongUsage{"NamespaceWithoutURI", {"--namespace", "p", "-e", "1"}, "--namespace"},
+        WrongUsage{"VariableNotUTF8", {"--var", "x=\xff", "-e", "1"}, "not UTF-8"},
+        WrongUsage{"RepeatZero", {"--repeat", "0", "-e", "1"}, "--repeat"},
+        WrongUsage{"RepeatNegative", {"--repeat", "-3", "-e", "1"}, "--repeat"},
+        WrongUsage{"RepeatNoNumber", {"--repeat", "often", "-e", "1"}, "--repeat"},
+        WrongUsage{"HTMLNotAvailable", {"--html", "-e", "1"}, "HTML input is not available"}),
+    [](const auto& parameter) { return parameter.param.name; });
+
+// --- input that cannot be read or parsed
+// ----------------------------------------------------------
+
+TEST(ExitStatus, AMissingQueryFileIsThree) {
+  const Outcome outcome = xquery({"/nowhere/query.xq"});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_THAT(outcome.err, HasSubstr("/nowhere/query.xq: No such file or directory"));
+}
+
+TEST(ExitStatus, ADirectoryAsQueryFileIsThree) {
+  const TemporaryDirectory directory;
+  const Outcome outcome = xquery({directory.path("")});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_THAT(outcome.err, HasSubstr("Is a directory"));
+}
+
+TEST(ExitStatus, AQueryFileThatIsNotUTF8IsThree) {
+  const TemporaryDirectory directory;
+  const Outcome outcome = xquery({directory.write("latin1.xq", "\"caf\xe9\"")});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, HasSubstr("latin1.xq: not UTF-8 text"));
+}
+
+TEST(ExitStatus, AMissingInputIsThree) {
+  const Outcome outcome = xquery({"-e", "1", "/nowhere/input.xml"});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, HasSubstr("/nowhere/input.xml"));
+  EXPECT_THAT(outcome.err, HasSubstr("No such file or directory"));
+}
+
+TEST(ExitStatus, AnInputWithoutANameIsThree) {
+  EXPECT_EQ(xquery({"-e", "1", ""}).status, 3);
+}
+
+TEST(ExitStatus, ADirectoryAsInputIsThree) {
+  const TemporaryDirectory directory;
+  const Outcome outcome = xquery({"-e", "1", directory.path("")});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_NE(outcome.err, "");
+}
+
+TEST(ExitStatus, MalformedXMLIsThreeWithFileLineAndColumn) {
+  const TemporaryDirectory directory;
+  const std::string file = directory.write("bad.xml", "<a>\n  <b></c>\n</a>\n");
+  const Outcome outcome = xquery({"-e", "1", file});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, ContainsRegex("bad\\.xml:2:[1-9][0-9]*: ."));
+}
+
+TEST(ExitStatus, MalformedXMLOnStandardInputIsThreeWithLineAndColumn) {
+  const Outcome outcome = xquery({"-e", "1", "-"}, "<a>");
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_THAT(outcome.err, ContainsRegex("standard input:1:[1-9][0-9]*: ."));
+}
+
+TEST(ExitStatus, AnEmptyInputIsThree) {
+  const TemporaryDirectory directory;
+  const Outcome outcome = xquery({"-e", "1", directory.write("empty.xml", "")});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_THAT(outcome.err, HasSubstr("empty.xml"));
+}
+
+TEST(ExitStatus, AMissingDocumentForAVariableIsThree) {
+  const Outcome outcome =
+      xquery({"--doc", "d=/nowhere/d.xml", "-e", "declare variable $d external; $d"});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_THAT(outcome.err, HasSubstr("/nowhere/d.xml"));
+}
+
+// --- output that cannot be written
+// ----------------------------------------------------------------
+
+TEST(ExitStatus, AClosedOutputPipeIsReportedAndIsThree) {
+  const Outcome outcome =
+      command::start("xquery", {"-e", "1 to 200000"}, "", command::StandardOutput::ClosedPipe);
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_THAT(outcome.err, HasSubstr("cannot write standard output: Broken pipe"));
+}
+
+TEST(ExitStatus, AFullDeviceIsReportedAndIsThree) {
+  const Outcome outcome = xquery({"-e", "1", "-o", "/dev/full"});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_THAT(outcome.err, HasSubstr("cannot write /dev/full: No space left on device"));
+}
+
+TEST(ExitStatus, AnOutputFileThatCannotBeOpenedIsThree) {
+  const Outcome outcome = xquery({"-e", "1", "-o", "/nowhere/out"});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_THAT(outcome.err, HasSubstr("cannot write /nowhere/out: No such file or directory"));
+}
+
+}  // namespace

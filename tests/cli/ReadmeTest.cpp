@@ -1,0 +1,42 @@
+// The README's program is the example that is compiled, and it does what the README says.
+#include "cli/Command.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+using command::books;
+using command::Outcome;
+using command::readFile;
+
+namespace {
+
+// The text between a fence that opens with "```language" and its end.
+std::string codeBlock(const std::string& markdown, const std::string& language) {
+  const std::string fence = "```" + language + "\n";
+  const size_t start = markdown.find(fence);
+  if (start == std::string::npos) return "";
+  const size_t text = start + fence.size();
+  return markdown.substr(text, markdown.find("```", text) - text);
+}
+
+TEST(Readme, ItsProgramIsTheCompiledExample) {
+  const std::string readme = readFile(XQUERY_SOURCE_DIR "/README.md");
+  const std::string example = readFile(XQUERY_SOURCE_DIR "/examples/embed.cpp");
+  ASSERT_NE(example, "");
+  EXPECT_EQ(codeBlock(readme, "cpp"), example);
+}
+
+TEST(Readme, TheExamplePrintsTheTitles) {
+  const Outcome outcome = command::start("xquery_embed", {books()});
+  EXPECT_EQ(outcome.status, 0);
+  EXPECT_EQ(outcome.out, "A Field Guide to Lichens\nBrücken & Wege\n");
+}
+
+TEST(Readme, TheExampleReportsADocumentThatIsNotThere) {
+  const Outcome outcome = command::start("xquery_embed", {"/nowhere.xml"});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_NE(outcome.err.find("/nowhere.xml: "), std::string::npos);
+}
+
+}  // namespace
