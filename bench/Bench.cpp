@@ -55,7 +55,7 @@ constexpr Row rows[] = {
     {"comparison", "//profile[@income > 50000]"},
     {"comparison", "//closed_auction[price > 300]/date"},
     {"comparison", "//item[location = \"Germany\"]/name"},
-    {"comparison", "//open_auction[initial < current]"},
+    {"comparison", "//open_auction[initial + 0 < current]"},
     {"arithmetic", "//bidder[increase * 2 + 1 > 20]"},
     {"arithmetic", "//open_auction[current - initial > 10]/seller"},
     {"arithmetic", "(1 to 1000000)[. * 2 + 1 > 1999000]", false},
