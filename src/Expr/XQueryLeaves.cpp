@@ -31,13 +31,15 @@ Ref<XQueryLiteral> XQueryLiteral::stringLiteralWithString(const Ref<NSString>& t
 }
 
 Ref<XQueryLiteral> XQueryLiteral::integerLiteralWithString(const Ref<NSString>& digits) {
-  return literalWithValue(
-      XQueryNumber::integerWithNumber(*NSDecimalNumber::decimalNumberWithString(digits->view())));
+  NSDecimal value;
+  if (!NSDecimal::scan(digits->view(), value)) return nullptr;
+  return literalWithValue(XQueryNumber::integerWithDecimal(value.truncated()));
 }
 
 Ref<XQueryLiteral> XQueryLiteral::decimalLiteralWithString(const Ref<NSString>& digits) {
-  return literalWithValue(
-      XQueryNumber::decimalWithNumber(*NSDecimalNumber::decimalNumberWithString(digits->view())));
+  NSDecimal value;
+  if (!NSDecimal::scan(digits->view(), value)) return nullptr;
+  return literalWithValue(XQueryNumber::numberWithDecimal(std::move(value)));
 }
 
 Ref<XQueryLiteral> XQueryLiteral::doubleLiteralWithString(const Ref<NSString>& text) {

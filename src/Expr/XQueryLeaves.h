@@ -14,7 +14,7 @@ class XQueryLiteral : public XQueryExpr {
 
   [[nodiscard]] static Ref<XQueryLiteral> literalWithValue(Value value);
   [[nodiscard]] static Ref<XQueryLiteral> stringLiteralWithString(const Ref<NSString>& text);
-  // Any number of digits.
+  // Both null for more digits than a decimal holds.
   [[nodiscard]] static Ref<XQueryLiteral> integerLiteralWithString(const Ref<NSString>& digits);
   [[nodiscard]] static Ref<XQueryLiteral> decimalLiteralWithString(const Ref<NSString>& digits);
   // What overflows becomes an infinity.

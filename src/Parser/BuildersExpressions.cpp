@@ -53,6 +53,14 @@ constexpr const char* flwor = "FLWOR expressions";
 constexpr const char* quantified = "quantified expressions";
 constexpr const char* typeswitch = "typeswitch expressions";
 
+// A literal of more digits than a decimal holds is an error of the query, never another number.
+NSObject* XQDigits(Ref<XQueryLiteral> literal, int64_t line) {
+  if (literal) return XQAtLine(std::move(literal), line);
+  XQueryParser::currentParser()->setError(
+      XQueryError::error(0, "limit: number of too many digits", line));
+  return XQEmptyLiteral(line);
+}
+
 }  // namespace
 
 NSObject* XQExpr(NSObject* expr, int64_t line) {
@@ -207,11 +215,11 @@ NSObject* XQVarNameReference(NSObject* name, int64_t line) {
 }
 
 NSObject* XQIntegerLiteral(NSObject* text, int64_t line) {
-  return XQAtLine(XQueryLiteral::integerLiteralWithString(XQRef<NSString>(text)), line);
+  return XQDigits(XQueryLiteral::integerLiteralWithString(XQRef<NSString>(text)), line);
 }
 
 NSObject* XQDecimalLiteral(NSObject* text, int64_t line) {
-  return XQAtLine(XQueryLiteral::decimalLiteralWithString(XQRef<NSString>(text)), line);
+  return XQDigits(XQueryLiteral::decimalLiteralWithString(XQRef<NSString>(text)), line);
 }
 
 NSObject* XQDoubleLiteral(NSObject* text, int64_t line) {

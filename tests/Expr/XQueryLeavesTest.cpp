@@ -52,6 +52,13 @@ TEST_F(Leaves, IntegerLiteralHasNoMachineWordLimit) {
             "123456789012345678901234567890");
 }
 
+TEST_F(Leaves, LiteralsOfMoreDigitsThanADecimalHoldsAreNone) {
+  const std::string digits(static_cast<size_t>(NSDecimal::maximumDigits), '9');
+  EXPECT_EQ(printed(evaluate(*integer(digits))), digits);
+  EXPECT_FALSE(integer(digits + "9"));
+  EXPECT_FALSE(XQueryLiteral::decimalLiteralWithString(text(digits + ".5")));
+}
+
 TEST_F(Leaves, DecimalLiteralIsADecimal) {
   const auto value = evaluate(*XQueryLiteral::decimalLiteralWithString(text("1.50")));
   EXPECT_EQ(XQueryObjectTypeID(value.get()), XQueryTypeDecimal);
