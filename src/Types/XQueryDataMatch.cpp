@@ -3,6 +3,7 @@
 #include "xquery/Collection.h"
 
 #include <cstring>
+#include <vector>
 
 namespace xquery {
 
@@ -16,13 +17,38 @@ std::string_view bytesOf(const NSObject* pattern) {
   return data ? data->bytes() : std::string_view();
 }
 
-Range matchAny(Matcher matcher, std::string_view data, const NSObject* patterns, size_t from) {
-  const NSArray* alternatives = dyn_cast<NSArray>(patterns);
-  if (!alternatives) return matcher(data, bytesOf(patterns), from);
-  for (const Value& pattern : alternatives->objects()) {
-    if (const Range found = matcher(data, bytesOf(pattern.get()), from)) return found;
+// Patterns tried in order. The searches of one object must be from positions that never decrease: a
+// pattern that is not found is not there from any later position either and is not looked for
+// again, so that all searches together take time in proportion to the data.
+class Alternatives {
+ public:
+  explicit Alternatives(const NSObject* patterns) {
+    if (const NSArray* array = dyn_cast<NSArray>(patterns)) {
+      for (const Value& pattern : array->objects()) _patterns.push_back(bytesOf(pattern.get()));
+    } else {
+      _patterns.push_back(bytesOf(patterns));
+    }
   }
-  return std::nullopt;
+
+  Range match(Matcher matcher, std::string_view data, size_t from) {
+    for (; _next < _patterns.size(); ++_next) {
+      if (const Range found = matcher(data, _patterns[_next], from)) return found;
+    }
+    return std::nullopt;
+  }
+
+ private:
+  std::vector<std::string_view> _patterns;
+  size_t _next = 0;  // the first pattern that may still be found
+};
+
+Range matchBetween(std::string_view data, Alternatives& start, Alternatives& end, size_t from) {
+  if (data.empty()) return std::nullopt;
+  const Range first = start.match(DataMatchStart, data, from);
+  if (!first) return std::nullopt;
+  const Range last = end.match(DataMatchEnd, data, first->end());
+  if (!last) return std::nullopt;
+  return XQueryDataRange{first->position, last->end() - first->position};
 }
 
 Value sliceOf(const NSData& data, const XQueryDataRange& range) {
@@ -55,22 +81,21 @@ Range DataMatchEnd(std::string_view data, std::string_view pattern, size_t from)
 }
 
 Range DataMatch(std::string_view data, const NSObject* start, const NSObject* end, size_t from) {
-  if (data.empty()) return std::nullopt;
-  const Range first = matchAny(DataMatchStart, data, start, from);
-  if (!first) return std::nullopt;
-  const Range last = matchAny(DataMatchEnd, data, end, first->end());
-  if (!last) return std::nullopt;
-  return XQueryDataRange{first->position, last->end() - first->position};
+  Alternatives starts(start);
+  Alternatives ends(end);
+  return matchBetween(data, starts, ends, from);
 }
 
 Value XQueryDataMatch(const NSData& data, const NSObject* start, const NSObject* end, bool all) {
-  size_t position = 0;
   if (!all) {
-    const Range range = DataMatch(data.bytes(), start, end, position);
+    const Range range = DataMatch(data.bytes(), start, end, 0);
     return range ? sliceOf(data, *range) : nullptr;
   }
+  Alternatives starts(start);
+  Alternatives ends(end);
   std::vector<Value> slices;
-  while (const Range range = DataMatch(data.bytes(), start, end, position)) {
+  size_t position = 0;
+  while (const Range range = matchBetween(data.bytes(), starts, ends, position)) {
     if (range->length == 0 || range->end() <= position) break;
     slices.push_back(sliceOf(data, *range));
     position = range->end();

@@ -1,6 +1,8 @@
 #include "Types/XQueryDataMatch.h"
 #include "TypesTestSupport.h"
 
+#include <chrono>
+
 namespace xquery {
 namespace {
 
@@ -92,6 +94,23 @@ TEST(DataMatchAll, EachSearchResumesAtTheEndOfThePreviousMatch) {
   EXPECT_EQ(all("<a>.<b><c", data("<"), data(">")), "[<a>][<b>]");
   EXPECT_EQ(all("aaaa", data("a"), data("a")), "[aa][aa]");
   EXPECT_EQ(all("a.b.c", nullptr, data(".")), "[a.][b.]");
+}
+
+TEST(DataMatchAll, AlternativesKeepTheirOrderAfterOneIsExhausted) {
+  EXPECT_EQ(all("b1.a2.b3;b4.", anyOf({"a", "b"}), anyOf({";", "."})), "[a2.b3;][b4.]");
+  EXPECT_EQ(all("a.b", anyOf({"x", ""}), anyOf({"y", "."})), "[a.]");
+}
+
+// Looking again and again for patterns that are not there would take minutes.
+TEST(DataMatchAll, AbsentAlternativesAreLookedForOnce) {
+  std::string bytes;
+  while (bytes.size() < 2000000) bytes += "<>";
+  const auto start = std::chrono::steady_clock::now();
+  const Ref<NSData> searched = NSData::dataWithBytes(std::move(bytes));
+  const Value slices =
+      XQueryDataMatch(*searched, anyOf({"absent", "<"}).get(), anyOf({"missing", ">"}).get(), true);
+  EXPECT_EQ(cast<NSArray>(slices)->count(), 1000000U);
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
 }
 
 TEST(DataMatchAll, StopsAtAnEmptyMatch) {
