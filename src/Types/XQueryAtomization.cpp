@@ -21,7 +21,7 @@ bool allAtomic(const std::vector<Value>& items) {
   return true;
 }
 
-// Two items or more, none of them counted by the caller's occurrence.
+// Of two items or more.
 Value typedValues(const Value& sequence, XQueryContext& context) {
   const std::vector<Value>& items = cast<NSArray>(sequence)->objects();
   if (allAtomic(items)) return sequence;
@@ -37,7 +37,7 @@ Value typedValues(const Value& sequence, XQueryContext& context) {
 bool isFalseNumber(const NSNumber& number) {
   switch (number.storage()) {
     case NSNumber::Storage::Boolean:
-      return &number == NSNumber::falseValue();
+      return !number.boolValue();
     case NSNumber::Storage::Int64:
     case NSNumber::Storage::UInt64:
       return number.unsignedLongLongValue() == 0 && number.longLongValue() == 0;

@@ -13,7 +13,7 @@ inline bool XQueryIsNode(const NSObject* object) {
   return object && object->isNode();
 }
 
-// What a number of items an atomization accepts.
+// How many items an atomization accepts.
 enum XQueryOccurrence : int {
   XQueryOccurrenceAny = 0,
   XQueryOccurrenceAnyAlso = 1,  // asked for as "at most one" but accepts any number all the same

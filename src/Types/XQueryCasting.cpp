@@ -17,6 +17,7 @@
 #include "xquery/XQuery.h"
 
 #include <array>
+#include <cmath>
 
 namespace xquery {
 
@@ -62,8 +63,7 @@ Value toMissingType(const Cast& cast) {
       XQueryError::error(6, "dates, times and durations are not available in this build"));
 }
 
-// --- from strings
-// ----------------------------------------------------------------------------------
+// --- from strings --------------------------------------------------------------------------------
 
 Value stringToUntypedAtomic(const Cast& cast) {
   return plainString(cast.string());
@@ -177,8 +177,7 @@ Value stringToNotation(const Cast& cast) {
   return XQueryNotation::notationWithString(plainString(cast.string()));
 }
 
-// --- from numbers
-// ----------------------------------------------------------------------------------
+// --- from numbers --------------------------------------------------------------------------------
 
 bool isEqual(const NSNumber& number, const XQueryNumber* other) {
   return number.isEqualToNumber(*other);
@@ -236,15 +235,16 @@ constexpr NumberFactory integerFactories[] = {
 };
 static_assert(std::size(integerFactories) == XQueryTypeUnsignedByte - XQueryTypeInteger + 1);
 
+// A decimal is no infinity however large it is, although it equals one where doubles compare.
 bool isSpecialValue(const NSNumber& number) {
   switch (number.storage()) {
-    case NSNumber::Storage::Boolean:
-    case NSNumber::Storage::Int64:
-    case NSNumber::Storage::UInt64:
-      return false;
+    case NSNumber::Storage::Double:
+    case NSNumber::Storage::Float:
+      return !std::isfinite(number.doubleValue());
+    case NSNumber::Storage::Decimal:
+      return number.storedDecimal()->isNaN();
     default:
-      return isEqual(number, XQueryNumber::nan()) || isEqual(number, XQueryNumber::negInf()) ||
-             isEqual(number, XQueryNumber::posInf());
+      return false;
   }
 }
 
@@ -262,8 +262,7 @@ Value numberToDecimal(const Cast& cast) {
   return factory(number);
 }
 
-// --- from the other classes
-// ------------------------------------------------------------------------
+// --- from the other classes ----------------------------------------------------------------------
 
 // A QName casts to string itself only, not to the types derived from it.
 Value toStringOnly(const Cast& cast) {
@@ -282,8 +281,7 @@ Value binaryToBase64Binary(const Cast& source) {
   return XQueryBase64Binary::binaryWithData(cast<XQueryBinary>(source.object)->data());
 }
 
-// --- the table
-// -------------------------------------------------------------------------------------
+// --- the table -----------------------------------------------------------------------------------
 
 enum class Source : uint8_t {
   String,

@@ -123,7 +123,7 @@ bool isXMLTarget(NSStringView target) {
 }  // namespace
 
 Ref<NSString> XQueryNodeStringValue(const NSXMLNode* node) {
-  return textOrEmpty(node->stringValue());
+  return textOrEmpty(node ? node->stringValue() : nullptr);
 }
 
 Ref<NSString> XQueryNodeTypedValue(const NSXMLNode* node) {
@@ -131,7 +131,7 @@ Ref<NSString> XQueryNodeTypedValue(const NSXMLNode* node) {
 }
 
 void XQueryNodeAddChildTextValues(const NSXMLNode* node, NSMutableString& text) {
-  const NSXMLNode* current = node->firstChild();
+  const NSXMLNode* current = node ? node->firstChild() : nullptr;
   while (current) {
     if (current->kind() == Kind::Text) text.append(current->textView());
     const NSXMLNode* next = current->kind() == Kind::Element ? current->firstChild() : nullptr;
@@ -144,7 +144,7 @@ void XQueryNodeAddChildTextValues(const NSXMLNode* node, NSMutableString& text) 
 }
 
 Ref<NSString> XQueryNodeName(const NSXMLNode* node) {
-  return node->name();
+  return node ? node->name() : nullptr;
 }
 
 Ref<NSString> XQueryNodeTypeName(const NSXMLNode*) {
@@ -242,7 +242,7 @@ Value XQueryNodeResolveIDRef(const NSXMLNode*, NSStringView) {
 }
 
 Ref<NSString> XQueryNodeStringRepresentaion(const NSXMLNode* node) {
-  return node->XMLString();
+  return node ? node->XMLString() : nullptr;
 }
 
 Ref<NSXMLDocument> XQueryNodeFromString(const NSString& string, uint32_t options) {

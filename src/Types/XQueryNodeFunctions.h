@@ -1,4 +1,5 @@
-// What the data model asks of a node.
+// What the data model asks of a node. Nothing here fails: of a missing node the answer is null, ""
+// or false.
 #pragma once
 
 #include "xquery/Object.h"

@@ -123,6 +123,11 @@ TEST_F(EffectiveBooleanValue, FalseForEmptyZeroNaNAndFalse) {
   }
 }
 
+TEST_F(EffectiveBooleanValue, ADoubleMadeOfABooleanCountsAsItsNumber) {
+  EXPECT_FALSE(XQueryIsTrue(ebv(XQueryNumber::doubleWithNumber(*NSNumber::falseValue()))));
+  EXPECT_TRUE(XQueryIsTrue(ebv(XQueryNumber::doubleWithNumber(*NSNumber::trueValue()))));
+}
+
 TEST_F(EffectiveBooleanValue, TrueForEverythingElse) {
   const Value trues[] = {NSNumber::trueValue(),
                          text("0"),

@@ -299,6 +299,25 @@ TEST_F(Casting, FromNumbersByTargetType) {
   }
 }
 
+TEST_F(Casting, ADecimalIsNoInfinityHoweverLargeItIs) {
+  const std::string digits = "1" + std::string(400, '0');
+  for (const XQueryTypeID type : {13, 42, 43, 44}) {
+    EXPECT_EQ(outcome(decimal(digits), type), std::to_string(type) + " " + digits);
+    EXPECT_EQ(outcome(text(digits), type), std::to_string(type) + " " + digits);
+  }
+  EXPECT_EQ(outcome(decimal("-" + digits), 46), "46 -" + digits);
+  EXPECT_EQ(outcome(decimal(digits), 51), "mismatch");
+  EXPECT_EQ(outcome(decimal(digits), 11), "11 INF");
+}
+
+TEST_F(Casting, TextOfTooManyDigitsIsNoDecimal) {
+  const std::string digits(1000000, '1');
+  EXPECT_EQ(outcome(text(digits), 13), "mismatch");
+  EXPECT_EQ(outcome(text(digits), 42), "mismatch");
+  EXPECT_EQ(outcome(text(digits), 11), "11 INF");
+  EXPECT_EQ(outcome(text("1e-999999999999999999999"), 13), "mismatch");
+}
+
 TEST_F(Casting, PlainPlatformNumbersCastAsDoubles) {
   EXPECT_EQ(outcome(NSNumber::numberWithLongLong(5), 42), "42 5");
   EXPECT_EQ(outcome(NSNumber::numberWithLongLong(5), 12), "12 5");

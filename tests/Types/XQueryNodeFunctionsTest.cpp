@@ -56,6 +56,18 @@ TEST(NodeAddChildTextValues, AppendsTheTextBelowInOrder) {
   EXPECT_EQ(utf8(string.string()), "=xyzwz");
 }
 
+TEST(NodeFunctions, AMissingNodeHasNothing) {
+  EXPECT_EQ(utf8(XQueryNodeStringValue(nullptr)), "");
+  EXPECT_EQ(utf8(XQueryNodeTypedValue(nullptr)), "");
+  EXPECT_FALSE(XQueryNodeName(nullptr));
+  EXPECT_FALSE(XQueryNodeStringRepresentaion(nullptr));
+  EXPECT_TRUE(CopyXQueryNodeNamespaces(nullptr).empty());
+  EXPECT_FALSE(XQueryNodeEqual(nullptr, parse("<a/>").get(), nullptr));
+  NSMutableString string;
+  XQueryNodeAddChildTextValues(nullptr, string);
+  EXPECT_EQ(string.length(), 0U);
+}
+
 TEST(NodeName, IsTheQualifiedNameAndThereIsNoTypeName) {
   const auto document = parse("<p:a xmlns:p='u'/>");
   EXPECT_EQ(utf8(XQueryNodeName(root(document))), "p:a");
@@ -70,6 +82,12 @@ TEST(NodeLanguage, IsThatOfTheNearestElementThatSaysOne) {
   EXPECT_FALSE(XQueryNodeLanguage(document.get()));
   EXPECT_FALSE(XQueryNodeLanguage(nullptr));
   EXPECT_FALSE(XQueryNodeLanguage(root(parse("<a/>"))));
+}
+
+TEST(NodeLanguage, AnEmptyOneHidesThoseFurtherOut) {
+  const auto document = parse("<a xml:lang='en'><b xml:lang=''><c/>t</b></a>");
+  EXPECT_EQ(utf8(XQueryNodeLanguage(named(document, "c"))), "");
+  EXPECT_EQ(utf8(XQueryNodeLanguage(named(document, "c")->nextSibling())), "");
 }
 
 TEST(NodeBaseURI, IsTheNearestAttributeAsWritten) {
