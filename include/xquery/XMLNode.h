@@ -88,6 +88,9 @@ struct NSXMLParseError {
   int64_t column = 0;
 };
 
+// A node of any kind. To walk a tree:
+//
+//   for (const NSXMLNode* node = root; node; node = node->nextNode()) ...
 class XQUERY_EXPORT NSXMLNode : public NSObject {
  public:
   static bool classof(const NSObject& object) { return object.isNode(); }
@@ -229,6 +232,10 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
 };
 
 // Names are qualified names as written; the URI is the namespace ("" for none).
+//
+//   auto title = NSXMLElement::elementWithName(NSStringView::ascii("title"));
+//   title->addChild(NSXMLNode::textWithStringValue(NSStringView::ascii("Emma")));
+//   title->XMLString();                                    // <title>Emma</title>
 class XQUERY_EXPORT NSXMLElement : public NSXMLNode {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Element; }
@@ -269,14 +276,22 @@ class XQUERY_EXPORT NSXMLElement : public NSXMLNode {
   friend class NSXMLTree;
 };
 
+// A whole document.
+//
+//   NSXMLParseError error;
+//   auto document = NSXMLDocument::documentWithFile("books.xml", NSXMLNodePreserveWhitespace,
+//                                                   &error);
+//   if (!document) ...                                     // error.message, error.line
 class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Document; }
   [[nodiscard]] static Ref<NSXMLDocument> document();
   // Parses XML 1.0 with namespaces; null, with `error` filled when given, for input that is not
-  // well formed. External entities and DTDs are never read; entity expansion is bounded; depth is
-  // bounded by memory only. Without NSXMLNodePreserveWhitespace a text of white space only is
-  // dropped unless xml:space says preserve.
+  // well formed. External entities and DTDs are never read. What internal entities and attribute
+  // defaults add is bounded by the larger of 10 MiB and 20 times the input, the attributes of one
+  // tag by some 45,000; depth and the length of texts (below 4 Gi units) by memory only. Without
+  // NSXMLNodePreserveWhitespace a text of white space only is dropped unless xml:space says
+  // preserve.
   [[nodiscard]] static Ref<NSXMLDocument> documentWithData(std::string_view bytes, uint32_t options,
                                                            NSXMLParseError* error = nullptr);
   // Reads the file in pieces (`-` is standard input). `error->line` is 0 when it cannot be read.
