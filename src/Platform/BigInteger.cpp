@@ -21,9 +21,9 @@ BigInteger BigInteger::fromDigits(const std::string& digits) {
   return result;
 }
 
-BigInteger BigInteger::powerOfTen(uint32_t exponent) {
+BigInteger BigInteger::power(uint32_t base, uint32_t exponent) {
   BigInteger result;
-  mpz_ui_pow_ui(result._value, 10, exponent);
+  mpz_ui_pow_ui(result._value, base, exponent);
   return result;
 }
 
@@ -41,12 +41,6 @@ BigInteger BigInteger::divide(const BigInteger& divisor) {
   BigInteger remainder;
   mpz_tdiv_qr(_value, remainder._value, _value, divisor._value);
   return remainder;
-}
-
-BigInteger BigInteger::greatestCommonDivisor(const BigInteger& a, const BigInteger& b) {
-  BigInteger result;
-  mpz_gcd(result._value, a._value, b._value);
-  return result;
 }
 
 uint32_t BigInteger::removeFactor(uint32_t factor) {

@@ -17,7 +17,8 @@ class BigInteger {
   static BigInteger fromHalves(uint64_t high, uint64_t low);
   // Decimal digits only.
   static BigInteger fromDigits(const std::string& digits);
-  static BigInteger powerOfTen(uint32_t exponent);
+  static BigInteger power(uint32_t base, uint32_t exponent);
+  static BigInteger powerOfTen(uint32_t exponent) { return power(10, exponent); }
   BigInteger(const BigInteger& other) { mpz_init_set(_value, other._value); }
   BigInteger(BigInteger&& other) noexcept {
     mpz_init(_value);
@@ -36,6 +37,9 @@ class BigInteger {
   int sign() const { return mpz_sgn(_value); }
   bool isOdd() const { return mpz_odd_p(_value) != 0; }
   bool isDivisibleBy(uint32_t divisor) const { return mpz_divisible_ui_p(_value, divisor) != 0; }
+  bool isDivisibleBy(const BigInteger& divisor) const {
+    return mpz_divisible_p(_value, divisor._value) != 0;
+  }
   bool fitsInt64() const { return mpz_fits_slong_p(_value) != 0; }
   int64_t int64() const { return mpz_get_si(_value); }
   bool fitsUInt64() const { return mpz_fits_ulong_p(_value) != 0; }
@@ -53,7 +57,6 @@ class BigInteger {
   BigInteger divide(const BigInteger& divisor);
   // The caller knows that nothing remains.
   void divideExactly(const BigInteger& divisor) { mpz_divexact(_value, _value, divisor._value); }
-  static BigInteger greatestCommonDivisor(const BigInteger& a, const BigInteger& b);
   // Divides by `factor` as often as nothing remains; answers how often.
   uint32_t removeFactor(uint32_t factor);
 

@@ -161,7 +161,7 @@ class NSDecimalArithmetic {
   static bool divideSmall(const NSDecimal& a, const NSDecimal& b, NSDecimal& quotient);
   static NSDecimal divideBig(const NSDecimal& a, const NSDecimal& b);
   static NSDecimal roundedSmallQuotient(int64_t numerator, uint64_t denominator);
-  static NSDecimal roundedQuotient(BigInteger numerator, BigInteger denominator);
+  static NSDecimal roundedQuotient(BigInteger numerator, BigInteger denominator, int64_t point);
   static NSDecimal roundSmall(const NSDecimal& value, int64_t drop, int32_t scale,
                               NSRoundingMode mode);
   static NSDecimal roundBig(const NSDecimal& value, int64_t drop, int32_t scale,
@@ -355,8 +355,10 @@ NSDecimal NSDecimalArithmetic::roundedSmallQuotient(int64_t numerator, uint64_t 
   return big(std::move(coefficient), scale);
 }
 
-// 38 significant digits of a quotient that does not end (or ends too late to be written out).
-NSDecimal NSDecimalArithmetic::roundedQuotient(BigInteger numerator, BigInteger denominator) {
+// 38 significant digits of a quotient that does not end (or ends too late to be written out), with
+// the point moved `point` places to the left.
+NSDecimal NSDecimalArithmetic::roundedQuotient(BigInteger numerator, BigInteger denominator,
+                                               int64_t point) {
   // The estimates of the digit counts may each be one too large; this yields 40 to 43 digits.
   const int64_t shift = int64_t{quotientDigits} + 3 +
                         static_cast<int64_t>(denominator.digitsAtMost()) -
@@ -373,30 +375,39 @@ NSDecimal NSDecimalArithmetic::roundedQuotient(BigInteger numerator, BigInteger 
   remainder.add(BigInteger(remainder));
   if (remainder.compare(power) >= 0) numerator.add(BigInteger(int64_t{1}));
   if (negative) numerator.negate();
-  return big(std::move(numerator), shift - static_cast<int64_t>(drop));
+  return big(std::move(numerator), shift - static_cast<int64_t>(drop) + point);
 }
 
+// Works on the coefficients; the scales only move the point. When the denominator is the product of
+// some twos, some fives and a rest, the quotient ends exactly when the rest divides the numerator.
+// That takes one division, where reducing the fraction would take many times as long.
 NSDecimal NSDecimalArithmetic::divideBig(const NSDecimal& a, const NSDecimal& b) {
-  BigInteger numerator;
-  BigInteger denominator;
-  alignBig(a, b, numerator, denominator);
-  const BigInteger divisor = BigInteger::greatestCommonDivisor(numerator, denominator);
-  numerator.divideExactly(divisor);
-  denominator.divideExactly(divisor);
-  if (denominator.sign() < 0) {
-    numerator.negate();
-    denominator.negate();
-  }
+  if (a.isZero()) return NSDecimal();
+  const int64_t point = int64_t{a._scale} - b._scale;
+  const BigInteger denominator = coefficient(b);
+  BigInteger numerator = coefficient(a);
   BigInteger rest = denominator;
-  const uint32_t scale = std::max(rest.removeFactor(2), rest.removeFactor(5));
-  const bool ends = rest.compare(BigInteger(int64_t{1})) == 0;
-  if (!ends || scale + numerator.digitsAtMost() > NSDecimal::maximumDigits) {
-    return roundedQuotient(std::move(numerator), std::move(denominator));
+  int64_t twos = -int64_t{rest.removeFactor(2)};
+  int64_t fives = -int64_t{rest.removeFactor(5)};
+  if (!numerator.isDivisibleBy(rest)) {
+    return roundedQuotient(std::move(numerator), denominator, point);
   }
-  BigInteger factor = BigInteger::powerOfTen(scale);
-  factor.divideExactly(denominator);
-  numerator.multiply(factor);
-  return big(std::move(numerator), scale);
+  BigInteger quotient = numerator;
+  quotient.divideExactly(rest);
+  twos += quotient.removeFactor(2);
+  fives += quotient.removeFactor(5);
+  const int64_t scale = std::max<int64_t>({0, -twos, -fives});
+  const auto twosLeft = static_cast<uint32_t>(twos + scale);
+  const auto fivesLeft = static_cast<uint32_t>(fives + scale);
+  // Three twos, and one five, make less than one digit.
+  const int64_t digits =
+      static_cast<int64_t>(quotient.digitsAtMost()) + twosLeft / 3 + fivesLeft + 1;
+  if (std::max(digits, scale + point) > NSDecimal::maximumDigits) {
+    return roundedQuotient(std::move(numerator), denominator, point);
+  }
+  quotient.multiply(BigInteger::power(2, twosLeft));
+  quotient.multiply(BigInteger::power(5, fivesLeft));
+  return big(std::move(quotient), scale + point);
 }
 
 NSDecimal NSDecimal::divide(const NSDecimal& divisor) const {

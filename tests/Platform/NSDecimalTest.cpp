@@ -157,6 +157,59 @@ TEST(Decimal, TheLargestNumbersAreHandledQuickly) {
   EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(1));
 }
 
+// Each is far quicker; the bound leaves room for a sanitizer and a busy machine.
+TEST(Decimal, NoQuotientTakesLong) {
+  const auto length = static_cast<size_t>(NSDecimal::maximumDigits);
+  std::mt19937_64 random(5);
+  const auto randomDigits = [&random](size_t count) {
+    std::string text;
+    while (text.size() < count) text += static_cast<char>('1' + random() % 9);
+    return text;
+  };
+  const std::string places = "e-" + std::to_string(length);
+  const NSDecimal operands[] = {
+      decimal(randomDigits(length)),
+      decimal(randomDigits(length - 1)),
+      decimal(randomDigits(length) + places),
+      decimal("1" + places),
+      decimal("1e" + std::to_string(length - 1)),
+      decimal("7"),
+  };
+  for (const NSDecimal& a : operands) {
+    for (const NSDecimal& b : operands) {
+      const auto start = std::chrono::steady_clock::now();
+      try {
+        const NSDecimal quotient = a.divide(b);
+        EXPECT_EQ(quotient.sign(), 1);
+      } catch (const std::length_error&) {  // as good an answer here
+      }
+      EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(500));
+    }
+  }
+}
+
+TEST(Decimal, QuotientsOfTwosAndFivesEndWhereTheyShould) {
+  const auto power = [](int64_t base, int exponent) {
+    NSDecimal result(1);
+    while (exponent-- > 0) result = result.multiply(NSDecimal(base));
+    return result;
+  };
+  EXPECT_EQ(power(2, 200).divide(power(2, 199)).toString(), "2");
+  EXPECT_EQ(power(2, 199).divide(power(2, 200)).toString(), "0.5");
+  EXPECT_EQ(power(5, 99).divide(power(5, 100)).toString(), "0.2");
+  EXPECT_EQ(power(10, 60).divide(power(2, 60)).compare(power(5, 60)), 0);
+  EXPECT_EQ(power(2, 90).divide(power(10, 90)).multiply(power(5, 90)).toString(), "1");
+  EXPECT_EQ(power(6, 80).divide(power(3, 80)).compare(power(2, 80)), 0);
+  EXPECT_EQ(power(3, 80).divide(power(6, 80)).multiply(power(2, 80)).toString(), "1");
+  EXPECT_EQ(power(6, 80).negate().divide(power(15, 80)).multiply(power(5, 80)).toString(),
+            "-" + power(2, 80).toString());
+  EXPECT_EQ(decimal("1e-30").divide(power(2, 70)).multiply(power(2, 70)).toString(),
+            decimal("1e-30").toString());
+  EXPECT_EQ(power(7, 50).divide(decimal("-7e-50")).toString(),
+            "-" + power(7, 49).toString() + std::string(50, '0'));
+  EXPECT_EQ(NSDecimal(0).divide(decimal("1e-100000")).toString(), "0");
+}
+
 TEST(Decimal, SumDifferenceAndProductAgreeWithTheReference) {
   std::mt19937_64 random(1);
   for (int round = 0; round < 20000; ++round) {

@@ -104,13 +104,13 @@ TEST(DataMatchAll, AlternativesKeepTheirOrderAfterOneIsExhausted) {
 // Looking again and again for patterns that are not there would take minutes.
 TEST(DataMatchAll, AbsentAlternativesAreLookedForOnce) {
   std::string bytes;
-  while (bytes.size() < 2000000) bytes += "<>";
+  while (bytes.size() < 500000) bytes += "<>";
   const auto start = std::chrono::steady_clock::now();
   const Ref<NSData> searched = NSData::dataWithBytes(std::move(bytes));
   const Value slices =
       XQueryDataMatch(*searched, anyOf({"absent", "<"}).get(), anyOf({"missing", ">"}).get(), true);
-  EXPECT_EQ(cast<NSArray>(slices)->count(), 1000000U);
-  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
+  EXPECT_EQ(cast<NSArray>(slices)->count(), 250000U);
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5));
 }
 
 TEST(DataMatchAll, StopsAtAnEmptyMatch) {
