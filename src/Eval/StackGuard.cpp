@@ -2,12 +2,11 @@
 
 #include "Eval/XQueryContextInternal.h"
 #include "Prolog/XQueryProlog.h"
-
-#include <pthread.h>
+#include "Types/XQueryErrors.h"
 
 #include <cstddef>
 #include <cstdint>
-#include <string_view>
+#include <pthread.h>
 
 namespace xquery {
 namespace {
@@ -34,8 +33,6 @@ uintptr_t lowestUsableAddress() {
 
 thread_local uintptr_t stackLimit = 0;
 
-constexpr std::string_view tooDeep = "limit: expression nested too deeply";
-
 }  // namespace
 
 bool XQueryStackHasRoom() {
@@ -44,14 +41,14 @@ bool XQueryStackHasRoom() {
 }
 
 void XQueryCheckStack(XQueryContext& context) {
-  if (!XQueryStackHasRoom()) context._internal().raise(XQueryError::error(0, tooDeep));
+  if (!XQueryStackHasRoom()) context._internal().raise(XQueryErrors::nestedTooDeeply.error());
 }
 
 bool XQueryCheckStack(XQueryProlog& prolog) {
   if (XQueryStackHasRoom()) return true;
   const auto& errors = prolog.errors();
-  if (errors.empty() || !(errors.back()->msg()->view() == tooDeep)) {
-    prolog.addError(XQueryError::error(0, tooDeep));
+  if (errors.empty() || !(errors.back()->msg()->view() == XQueryErrors::nestedTooDeeply.text)) {
+    prolog.addError(XQueryErrors::nestedTooDeeply.error());
   }
   return false;
 }

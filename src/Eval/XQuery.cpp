@@ -1,17 +1,18 @@
 // The exported classes: thin shells over their private objects, and the evaluation driver.
 #include "xquery/XQuery.h"
 
-#include <new>
-#include <stdexcept>
-
 #include "Eval/XQueryContextInternal.h"
 #include "Eval/XQueryInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/NSLog.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
+#include "Types/XQueryErrors.h"
 #include "Types/XQueryValues.h"
 #include "xquery/XMLNode.h"
+
+#include <new>
+#include <stdexcept>
 
 namespace xquery {
 
@@ -21,8 +22,7 @@ Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source) {
 
 Ref<XQuery> XQuery::xqueryWithSource(std::string_view source) {
   if (const auto text = NSString::stringWithUTF8(source)) return xqueryWithSource(text);
-  return make<XQuery>(std::make_unique<XQueryInternal>(
-      XQueryError::error(3, "the query is not well-formed UTF-8")));
+  return make<XQuery>(std::make_unique<XQueryInternal>(XQueryErrors::notUTF8.error()));
 }
 
 XQuery::XQuery(std::unique_ptr<XQueryInternal> internal)
@@ -36,7 +36,9 @@ Ref<NSArray> XQuery::parseErrors() const {
   return NSArray::arrayWithObjects(std::vector<Value>(errors.begin(), errors.end()));
 }
 
-Ref<XQueryContext> XQueryContext::xqueryContext() { return make<XQueryContext>(); }
+Ref<XQueryContext> XQueryContext::xqueryContext() {
+  return make<XQueryContext>();
+}
 
 Ref<XQueryContext> XQueryContext::xqueryContextWithNamespaces(
     const std::map<std::string, std::string>& namespaces) {
@@ -60,7 +62,9 @@ void XQueryContext::contextSetClient(std::shared_ptr<XQueryClient> client) {
   _private->setClient(std::move(client));
 }
 
-std::shared_ptr<XQueryClient> XQueryContext::contextClient() const { return _private->client(); }
+std::shared_ptr<XQueryClient> XQueryContext::contextClient() const {
+  return _private->client();
+}
 
 void XQueryContext::contextAddClientSelector(std::string_view, std::string_view) {}
 
@@ -68,21 +72,15 @@ void XQueryContext::_traceValue(const Value& value, const Ref<NSString>& forLabe
   if (const auto client = _private->client()) {
     client->XQueryClientTraceValue(value, forLabel, *this);
   } else if (XQueryLogEnabled()) {
-    NSLog(XQueryDescription(forLabel.get())->utf8() + " " +
-          XQueryDescription(value.get())->utf8());
+    NSLog(XQueryDescription(forLabel.get())->utf8() + " " + XQueryDescription(value.get())->utf8());
   }
 }
 
 namespace {
 
-// Names a constant or declaration in a message: error 16, unresloved (so spelled) external.
-[[noreturn]] void raiseUnresolved(XQueryContextInternal& context, std::string_view kind,
-                                  const XQueryQName& name) {
-  std::string message = "unresloved external ";
-  message += kind;
-  message += " - ";
-  message += name.XQueryStringValue()->utf8();
-  context.raise(XQueryError::error(16, message));
+[[noreturn]] void raiseUnresolved(const XQueryErrorText<1>& text, const XQueryQName& name,
+                                  XQueryContextInternal& context) {
+  context.raise(text.error(name.XQueryStringValue()));
 }
 
 void setConstants(const XQueryConstants& constants, const XQueryProlog& prolog,
@@ -98,7 +96,7 @@ void evaluateVariable(const XQueryVarDecl& declaration, XQueryContext& publicCon
   auto& context = publicContext._internal();
   if (declaration.isExternal()) {
     if (!context.globalForQName(*declaration.name())) {
-      raiseUnresolved(context, "variable", *declaration.name());
+      raiseUnresolved(XQueryErrors::unresolvedExternalVariable, *declaration.name(), context);
     }
     return;
   }
@@ -110,7 +108,8 @@ void evaluateVariable(const XQueryVarDecl& declaration, XQueryContext& publicCon
   const Value value = declaration.expr()->evaluateWithContext(publicContext);
   context.setActiveProlog(prolog);
   context.setOrdered(ordered);
-  if (!value) raiseUnresolved(context, "variable", *declaration.name());
+  if (!value)
+    raiseUnresolved(XQueryErrors::unresolvedExternalVariable, *declaration.name(), context);
   context.setGlobal(value, declaration.name());
 }
 
@@ -121,7 +120,8 @@ void evaluateDeclarations(const XQueryProlog& prolog, XQueryContext& context) {
     } else if (const auto* function = dyn_cast<XQueryFunctionDecl>(declaration)) {
       if (function->isExternal() &&
           !context._internal().XQueryExternalFunctionForQName(*function->name())) {
-        raiseUnresolved(context._internal(), "function", *function->name());
+        raiseUnresolved(XQueryErrors::unresolvedExternalFunction, *function->name(),
+                        context._internal());
       }
     }
   }
@@ -164,9 +164,9 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   } catch (const NSException&) {
     result = context.error();
   } catch (const std::bad_alloc&) {
-    result = XQueryError::error(0, "limit: out of memory");
+    result = XQueryErrors::outOfMemory.error();
   } catch (const std::length_error&) {
-    result = XQueryError::error(0, "limit: out of memory");
+    result = XQueryErrors::outOfMemory.error();
   }
   context._clearGlobals();
   return shapedResult(result, error);

@@ -4,10 +4,10 @@
 // holds the elements otherwise. At most one of the two is in use.
 #pragma once
 
+#include "xquery/Object.h"
+
 #include <utility>
 #include <vector>
-
-#include "xquery/Object.h"
 
 namespace xquery {
 

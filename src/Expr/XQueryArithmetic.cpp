@@ -4,10 +4,10 @@
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
+#include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Collection.h"
-#include "xquery/Error.h"
 
 #include <array>
 #include <cmath>
@@ -105,7 +105,7 @@ bool isExact(XQueryTypeID type) {
 }
 
 Value divisionByZero() {
-  return XQueryError::error(6, "Division by zero");
+  return XQueryErrors::divisionByZero.error();
 }
 
 Value calculateInCommonType(const NumericWork& work, const Value& a, const Value& b,
@@ -295,7 +295,7 @@ Value XQueryArithmeticPlainly(int type, const Value& left, const Value& right,
   const XQueryTypeID untypedAs = type == XQueryOperatorIDiv ? XQueryTypeInteger : XQueryTypeDouble;
   a = asNumberIfUntyped(a, untypedAs, context);
   b = asNumberIfUntyped(b, untypedAs, context);
-  if (dividesByZero(type, a, b)) return XQueryError::error(6, "divide by zero");
+  if (dividesByZero(type, a, b)) return XQueryErrors::divideByZero.error();
   const XQueryTypeID leftType = XQueryObjectTypeID(a.get());
   const XQueryTypeID rightType = XQueryObjectTypeID(b.get());
   for (const Row& row : rows) {

@@ -2,6 +2,8 @@
 
 namespace xquery {
 
-Ref<NSString> XQueryExpr::description() const { return NSString::stringWithASCII("<XQueryExpr>"); }
+Ref<NSString> XQueryExpr::description() const {
+  return NSString::stringWithASCII("<XQueryExpr>");
+}
 
 }  // namespace xquery

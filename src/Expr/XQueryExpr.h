@@ -5,10 +5,10 @@
 // per evaluation. Evaluation never changes an expression, so one tree serves several threads.
 #pragma once
 
-#include <cstdint>
-
 #include "xquery/Object.h"
 #include "xquery/String.h"
+
+#include <cstdint>
 
 namespace xquery {
 

@@ -2,6 +2,7 @@
 
 #include "Eval/XQueryContextInternal.h"
 #include "Prolog/XQueryProlog.h"
+#include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"
 #include "Types/XQueryValues.h"
@@ -9,18 +10,6 @@
 #include "xquery/Number.h"
 
 namespace xquery {
-namespace {
-
-// `text` followed by the name in double quotes.
-std::string quoting(std::string_view text, const Ref<NSString>& name) {
-  std::string message(text);
-  message += '"';
-  if (name) message += name->utf8();
-  message += '"';
-  return message;
-}
-
-}  // namespace
 
 Ref<XQueryLiteral> XQueryLiteral::literalWithValue(Value value) {
   return make<XQueryLiteral>(std::move(value));
@@ -47,9 +36,8 @@ Ref<XQueryLiteral> XQueryLiteral::doubleLiteralWithString(const Ref<NSString>& t
   double value = 0;
   scanDouble(text->view(), value);
   Ref<XQueryNumber> number = XQueryNumber::numberWithDouble(value);
-  return literalWithValue(XQueryNumber::isSpecial(number.get())
-                              ? number
-                              : XQueryNumber::doubleWithNumber(*number));
+  return literalWithValue(
+      XQueryNumber::isSpecial(number.get()) ? number : XQueryNumber::doubleWithNumber(*number));
 }
 
 Ref<NSString> XQueryLiteral::description() const {
@@ -79,8 +67,7 @@ Value XQueryVariable::evaluateWithContext(XQueryContext& context) const {
     value = dynamic.globalForQName(*_qName);
   }
   if (!value) {
-    dynamic.raise(
-        XQueryError::error(8, quoting("reference to undefined variable ", _name), exprLine()));
+    dynamic.raise(XQueryErrors::undefinedVariable.errorAtLine(exprLine(), _name));
   }
   return value;
 }
@@ -123,7 +110,7 @@ Value XQueryQNameReference::evaluateWithContext(XQueryContext& context) const {
       return XQueryQName::qname(_localPart, URI);
     }
   }
-  dynamic.raise(XQueryError::error(1, quoting("can't resolve QName for ", _name), exprLine()));
+  dynamic.raise(XQueryErrors::unresolvedQName.errorAtLine(exprLine(), _name));
 }
 
 }  // namespace xquery

@@ -48,7 +48,8 @@ class XQueryVariable : public XQueryExpr {
   Value evaluateWithContext(XQueryContext& context) const override;
 
  protected:
-  explicit XQueryVariable(Ref<NSString> name) : XQueryExpr(Kind::Variable), _name(std::move(name)) {}
+  explicit XQueryVariable(Ref<NSString> name)
+      : XQueryExpr(Kind::Variable), _name(std::move(name)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 

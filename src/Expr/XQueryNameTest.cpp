@@ -9,14 +9,11 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Prolog/XQueryProlog.h"
+#include "Types/XQueryErrors.h"
 #include "xquery/Collection.h"
 
 namespace xquery {
 namespace {
-
-Ref<XQueryError> unresolvedName(const NSString& name, int64_t line) {
-  return XQueryError::error(1, "can't resolve QName for \"" + name.utf8() + "\"", line);
-}
 
 bool haveSameURI(const NSXMLNode& node, const Ref<NSString>& URI) {
   const NSStringView ofNode = node.URIView();
@@ -53,7 +50,7 @@ void XQueryNameTest::bindInfoForProlog(XQueryProlog& prolog) {
     return;
   }
   if (prolog.isModule()) {
-    prolog.addError(unresolvedName(*_name, _line));
+    prolog.addError(XQueryErrors::unresolvedQName.errorAtLine(_line, _name));
     return;
   }
   auto reference = XQueryQNameReference::qNameReferenceWithString(_name, _line);

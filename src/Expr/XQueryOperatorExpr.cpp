@@ -5,8 +5,8 @@
 #include "Expr/XQueryArithmetic.h"
 #include "Expr/XQueryLeaves.h"
 #include "Types/XQueryAtomization.h"
+#include "Types/XQueryErrors.h"
 #include "xquery/Collection.h"
-#include "xquery/Error.h"
 
 #include <array>
 #include <cstddef>
@@ -15,8 +15,6 @@
 
 namespace xquery {
 namespace {
-
-constexpr std::string_view invalidType = "invalid type for operator";
 
 enum OperatorClass : int {
   NoClass = 0,
@@ -87,8 +85,8 @@ Value dispatch(int type, const Value& left, const Value& right, XQueryContext& c
 // negative line is none.
 [[noreturn]] void raiseFailure(const Value& answer, int64_t line, XQueryContext& context) {
   const auto* record = dyn_cast<XQueryError>(answer.get());
-  const int64_t number = record ? record->err() : 6;
-  const Ref<NSString> message = record ? record->msg() : NSString::stringWithASCII(invalidType);
+  const int64_t number = record ? record->err() : XQueryErrors::invalidOperand.number;
+  const Ref<NSString> message = record ? record->msg() : XQueryErrors::invalidOperand.message();
   context._internal().raise(line < 0 ? XQueryError::error(number, message)
                                      : XQueryError::error(number, message, line));
 }

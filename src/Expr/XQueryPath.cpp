@@ -18,6 +18,7 @@
 #include "Expr/XQueryPathRun.h"
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryAtomization.h"
+#include "Types/XQueryErrors.h"
 
 #include <algorithm>
 
@@ -32,8 +33,8 @@ bool allAreNodes(const Value& items) {
   return true;
 }
 
-[[noreturn]] void raiseNoNode(int64_t number, std::string_view message, XQueryContext& context) {
-  context._internal().raise(XQueryError::error(number, message));
+[[noreturn]] void raiseNoNode(const XQueryErrorText<>& text, XQueryContext& context) {
+  context._internal().raise(text.error());
 }
 
 // Whether the node's descendant axis ends where its subtree ends.
@@ -146,7 +147,7 @@ void XQueryAxisStep::processValue(const Value& items, XQueryPathRun& run, bool v
     if (auto* node = dyn_cast<NSXMLNode>(list[i])) {
       processNode(node, run);
     } else if (validate) {
-      raiseNoNode(20, "context item not a node", run.context);
+      raiseNoNode(XQueryErrors::contextItemNotANode, run.context);
     }
   }
 }
@@ -264,7 +265,7 @@ void XQueryFilterStep::processItem(NSObject* item, int64_t position, XQueryPathR
                                    bool validate) const {
   XQueryContext& context = run.context;
   XQueryCheckStack(context);
-  if (_next && !XQueryIsNode(item)) raiseNoNode(19, "item not a node", context);
+  if (_next && !XQueryIsNode(item)) raiseNoNode(XQueryErrors::itemNotANode, context);
   context._internal().setContextItem(item, position);
   Value value = _expr ? _expr->evaluateWithContext(context) : Value(NSNull::null());
   value = handlePreicatesFromIndex(0, std::move(value), context);
@@ -272,7 +273,7 @@ void XQueryFilterStep::processItem(NSObject* item, int64_t position, XQueryPathR
     run.results.add(value.get(), context);
     return;
   }
-  if (!allAreNodes(value)) raiseNoNode(19, "item not a node", context);
+  if (!allAreNodes(value)) raiseNoNode(XQueryErrors::itemNotANode, context);
   _next->processValue(value, run, validate);
 }
 
@@ -293,7 +294,7 @@ Ref<XQueryRootStepExpr> XQueryRootStepExpr::expr() {
 
 Value XQueryRootStepExpr::evaluateWithContext(XQueryContext& context) const {
   const auto* node = dyn_cast<NSXMLNode>(context._internal().contextItem());
-  if (!node) raiseNoNode(20, "context item not a node", context);
+  if (!node) raiseNoNode(XQueryErrors::contextItemNotANode, context);
   return XQueryTreatAs(node->rootNode(), *_type, context);
 }
 

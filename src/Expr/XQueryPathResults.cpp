@@ -3,6 +3,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/NodeOrder.h"
 #include "Expr/XQuerySequence.h"
+#include "Types/XQueryErrors.h"
 #include "Types/XQueryTypeTable.h"
 
 #include <algorithm>
@@ -10,8 +11,8 @@
 namespace xquery {
 namespace {
 
-[[noreturn]] void raiseWrongItem(std::string_view message, XQueryContext& context) {
-  context._internal().raise(XQueryError::error(19, message));
+[[noreturn]] void raiseWrongItem(const XQueryErrorText<>& text, XQueryContext& context) {
+  context._internal().raise(text.error());
 }
 
 }  // namespace
@@ -28,17 +29,16 @@ void XQueryPathResults::addItem(NSObject* item, XQueryContext& context) {
   if (auto* node = dyn_cast<NSXMLNode>(item)) {
     addNode(node, context);
   } else if (XQueryIsAtomicType(item)) {
-    if (_type == Nodes) raiseWrongItem("item not a node", context);
+    if (_type == Nodes) raiseWrongItem(XQueryErrors::itemNotANode, context);
     _type = AtomicValues;
     storeByIdentity(item);
   } else {
-    raiseWrongItem("item not a node or atomic type", context);
+    raiseWrongItem(XQueryErrors::itemNotANodeOrAtomic, context);
   }
 }
 
 void XQueryPathResults::addNode(NSXMLNode* node, XQueryContext& context) {
-  // The text is cut short; callers know it so.
-  if (_type == AtomicValues) raiseWrongItem("item not an atomic typ", context);
+  if (_type == AtomicValues) raiseWrongItem(XQueryErrors::itemNotAtomic, context);
   _type = Nodes;
   storeNode(node);
 }

@@ -29,7 +29,9 @@ class XQuerySequence : public NSArray {
   friend Ref<T> make(Arguments&&...);
 };
 
-inline bool isNull(const Value& value) { return value && value->kind() == Kind::Null; }
+inline bool isNull(const Value& value) {
+  return value && value->kind() == Kind::Null;
+}
 
 // A one-element array becomes its element and an empty array NSNull; anything else is unchanged.
 Value normalised(Value value);

@@ -3,10 +3,10 @@
 #include "Expr/NodeOrder.h"
 #include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
+#include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Collection.h"
-#include "xquery/Error.h"
 
 #include <algorithm>
 #include <cstdint>
@@ -37,7 +37,7 @@ uint64_t mostRangeItems() {
 }
 
 [[noreturn]] void raiseRangeTooLong(XQueryContext& context) {
-  context._internal().raise(XQueryError::error(0, "limit: range of too many items"));
+  context._internal().raise(XQueryErrors::rangeTooLong.error());
 }
 
 Value integersFrom(int64_t first, int64_t last, XQueryContext& context) {

@@ -3,6 +3,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryNameTest.h"
 #include "Prolog/XQueryProlog.h"
+#include "Types/XQueryErrors.h"
 #include "Types/XQueryQName.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Collection.h"
@@ -183,7 +184,7 @@ bool XQueryInstanceOf(const NSObject* object, const XQueryTypeDeclaration& insta
 Value XQueryTreatAs(const Value& object, const XQueryTypeDeclaration& treatAs,
                     XQueryContext& forContext) {
   if (!XQueryInstanceOf(object.get(), treatAs, &forContext)) {
-    forContext._internal().raise(XQueryError::error(6, "invalid type"));
+    forContext._internal().raise(XQueryErrors::invalidType.error());
   }
   return object;
 }

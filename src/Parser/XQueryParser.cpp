@@ -3,6 +3,7 @@
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
 #include "Platform/NSLog.h"
+#include "Types/XQueryErrors.h"
 
 #include <algorithm>
 #include <climits>
@@ -18,32 +19,26 @@ unsigned sXQueryParserSetterFlags = 0;
 
 struct SetterError {
   unsigned flag;
-  int64_t number;
-  const char* message;
+  XQueryErrorText<> text;
 };
 
 constexpr SetterError setterErrors[] = {
-    {XQuerySetterXMLSpace, 68, "Prolog contains more than one xmlspace declaration"},
-    {XQuerySetterDefaultCollation, 38,
-     "Prolog contains more than one default collation declaration"},
-    {XQuerySetterBaseURI, 32, "Prolog contains more than one base URI declaration"},
-    {XQuerySetterConstruction, 67, "Prolog contains more than one construction declaration"},
-    {XQuerySetterOrdering, 65, "Prolog contains more than one ordering mode declaration"},
-    {XQuerySetterEmptyOrdering, 69, "Prolog contains more than one empty ordering declaration"},
-    {XQuerySetterInheritNamespaces, 55,
-     "Prolog contains more than one inherit-namespaces declaration"},
+    {XQuerySetterXMLSpace, XQueryErrors::secondXMLSpace},
+    {XQuerySetterDefaultCollation, XQueryErrors::secondDefaultCollation},
+    {XQuerySetterBaseURI, XQueryErrors::secondBaseURI},
+    {XQuerySetterConstruction, XQueryErrors::secondConstruction},
+    {XQuerySetterOrdering, XQueryErrors::secondOrderingMode},
+    {XQuerySetterEmptyOrdering, XQueryErrors::secondEmptyOrdering},
+    {XQuerySetterInheritNamespaces, XQueryErrors::secondInheritNamespaces},
 };
 
-void record(Ref<XQueryError> error, std::string_view text) {
-  if (XQueryLogEnabled()) NSLog(text);
+void record(Ref<XQueryError> error) {
+  if (XQueryLogEnabled()) NSLog(error->msg()->utf8());
   sXQueryParserCurrent->setError(std::move(error));
 }
 
-// `text`, " - " or "- ", and the current source line.
-std::string withSourceLine(std::string text, std::string_view separator) {
-  text += separator;
-  sXQueryParserCurrent->sourceLine(XQlineno)->view().appendUTF8To(text);
-  return text;
+Ref<NSString> currentSourceLine() {
+  return sXQueryParserCurrent->sourceLine(XQlineno);
 }
 
 }  // namespace
@@ -90,7 +85,7 @@ void XQueryParser::parse() {
     _parsedModule = nullptr;
   } catch (const std::exception& failure) {
     _parsedModule = nullptr;
-    setError(XQueryError::error(3, failure.what()));
+    setError(XQueryErrors::parserFailure.error(std::string_view(failure.what())));
   }
 }
 
@@ -102,8 +97,7 @@ void XQueryParser::setUnavailable(std::string_view construct, int64_t line) {
 
 void XQueryParser::reportUnavailable() {
   if (_unavailable.empty() || !_errors.empty()) return;
-  const std::string text = _unavailable + " are not available in this build";
-  record(XQueryError::error(0, text, _unavailableLine), text);
+  record(XQueryErrors::unavailableConstruct.errorAtLine(_unavailableLine, _unavailable));
 }
 
 Ref<NSString> XQueryParser::sourceLine(int64_t index) {
@@ -157,27 +151,21 @@ void* XQueryParserAllocate(size_t size) {
 }
 
 void XQerror(const char* message) {
-  std::string text = message;
-  text += " invalid token (";
-  text += XQScannerTokenText();
-  text = withSourceLine(std::move(text) + ")", "- ");
-  record(XQueryError::error(3, text, XQlineno), text);
+  record(XQueryErrors::invalidToken.errorAtLine(XQlineno, message, XQScannerTokenText(),
+                                                currentSourceLine()));
 }
 
 void XQueryParseError(std::string_view message) {
-  const std::string text = withSourceLine(std::string(message), " - ");
-  record(XQueryError::error(3, text, XQlineno), text);
+  record(XQueryErrors::scannerError.errorAtLine(XQlineno, message, currentSourceLine()));
 }
 
 void XQueryFatalError(const char* message) {
-  record(XQueryError::error(3, message), message);
+  record(XQueryErrors::parserFailure.error(message));
   throw NSException("XQueryLexFatalErr", NSString::stringWithUTF8(message));
 }
 
 void XQueryParserExtension(const Ref<NSString>& name, const Ref<NSString>& content, int64_t line) {
-  const std::string text =
-      "must-understand extension not supported (" + name->utf8() + " " + content->utf8() + ")";
-  record(XQueryError::error(14, text, line), text);
+  record(XQueryErrors::mustUnderstandExtension.errorAtLine(line, name, content));
 }
 
 void XQueryParserPragma(const Ref<NSString>&, const Ref<NSString>&, int64_t) {}
@@ -186,7 +174,7 @@ void XQueryParserSetSetterFlag(unsigned flag, int64_t line) {
   for (const SetterError& row : setterErrors) {
     if (row.flag != flag) continue;
     if (sXQueryParserSetterFlags & flag) {
-      sXQueryParserCurrent->setError(XQueryError::error(row.number, row.message, line));
+      sXQueryParserCurrent->setError(row.text.errorAtLine(line));
     }
     sXQueryParserSetterFlags |= flag;
     return;

@@ -1,8 +1,8 @@
 #include "Prolog/XQueryDeclarations.h"
 
 #include "Prolog/XQueryProlog.h"
+#include "Types/XQueryErrors.h"
 #include "xquery/Collection.h"
-#include "xquery/Error.h"
 
 namespace xquery {
 
@@ -30,7 +30,7 @@ Ref<XQueryParam> XQueryParam::paramWithName(Ref<NSString> name, Ref<XQueryTypeDe
 void XQueryParam::bindInfoForProlog(XQueryProlog& prolog) {
   if (const auto qName = prolog.variableQNameFromString(_name)) {
     if (prolog.localVariableIDForQName(qName) != 0) {
-      prolog.addError(XQueryError::error(39, "more than one parameter with the same name"));
+      prolog.addError(XQueryErrors::duplicateParameter.error());
     } else {
       _varID = prolog.newLocalVariableIDForQName(qName);
     }

@@ -4,10 +4,11 @@
 #include "Prolog/XQueryProlog.h"
 
 #include "Expr/XQueryLeaves.h"
-#include "Prolog/MessageText.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryPrologItems.h"
+#include "Types/MessageText.h"
+#include "Types/XQueryErrors.h"
 
 #include <algorithm>
 #include <array>
@@ -86,8 +87,7 @@ Ref<XQueryProlog> XQueryProlog::prologWithItems(const std::vector<Ref<XQueryProl
                                                 const Ref<NSString>& version) {
   auto prolog = make<XQueryProlog>(std::move(forModules));
   if (version && !(version->view() == "1.0")) {
-    prolog->addError(
-        XQueryError::error(31, messageText("version \"", version, "\" not supported")));
+    prolog->addError(XQueryErrors::unsupportedVersion.error(version));
   }
   prolog->_location = std::move(atLocation);
   prolog->_addItems(items);

@@ -1,10 +1,10 @@
 // The declarations of a prolog: their tables, the import of those of library modules, the numbering
 // of local variables, and the binding pass over the declarations.
-#include "Prolog/MessageText.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
+#include "Types/XQueryErrors.h"
 
 namespace xquery {
 
@@ -70,10 +70,9 @@ void XQueryProlog::_resolveImports() {
       _importDeclarations(*module);
       continue;
     }
-    const auto message = messageText("can't access module for ", item->description());
     // Without any location clause the failure is recorded twice.
-    if (!item->locations()) addError(XQueryError::error(47, message));
-    addError(XQueryError::error(47, message));
+    if (!item->locations()) addError(XQueryErrors::moduleNotFound.error(item->description()));
+    addError(XQueryErrors::moduleNotFound.error(item->description()));
   }
 }
 
@@ -91,8 +90,7 @@ void XQueryProlog::_importDeclarations(const XQueryProlog& module) {
       const auto& name = variable->name();
       if (!isOwn(*name)) continue;
       if (variableInfoForQName(name)) {
-        addError(XQueryError::error(
-            37, messageText("duplicate definition of variable ", name->XQueryStringValue())));
+        addError(XQueryErrors::duplicateVariable.error(name->XQueryStringValue()));
       } else {
         setVariableInfo(variable, name);
       }
@@ -101,8 +99,7 @@ void XQueryProlog::_importDeclarations(const XQueryProlog& module) {
       if (!isOwn(*name)) continue;
       const XQueryFunctionSignature signature(name, function->params().size());
       if (functionInfoForSignature(signature)) {
-        addError(XQueryError::error(
-            37, messageText("duplicate definition of function ", name->XQueryStringValue())));
+        addError(XQueryErrors::duplicateFunction.error(name->XQueryStringValue()));
       } else {
         setFunctionInfo(function, signature);
       }

@@ -1,9 +1,9 @@
 #include "Prolog/XQueryPrologItems.h"
 
-#include "Prolog/MessageText.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
-#include "xquery/Error.h"
+#include "Types/MessageText.h"
+#include "Types/XQueryErrors.h"
 
 namespace xquery {
 
@@ -24,9 +24,9 @@ Ref<NSString> joined(const XQueryPrologItemLocations& locations) {
   return out.string();
 }
 
-void addItemError(XQueryProlog& prolog, int64_t number, std::string_view message,
+void addItemError(XQueryProlog& prolog, const XQueryErrorText<1>& text,
                   const XQueryPrologItem& item) {
-  prolog.addError(XQueryError::error(number, messageText(message, item.description())));
+  prolog.addError(text.error(item.description()));
 }
 
 // Registers the namespace of an import and its prefix; false for a prefix bound to another one.
@@ -37,7 +37,7 @@ bool addImportedNamespace(XQueryProlog& prolog, const Ref<NSString>& URI,
   if (!prefix) return true;
   const int64_t boundID = prolog.namespaceIDForPrefix(prefix->view());
   if (boundID != XQueryNamespaceNone && boundID != id) {
-    addItemError(prolog, 33, "invalid resuse of prefix for ", item);
+    addItemError(prolog, XQueryErrors::prefixReused, item);
     return false;
   }
   prolog.addNamespace(URI, prefix);
@@ -91,7 +91,7 @@ void XQueryPrologItemDefaultCollation::XQueryUpdateProlog(XQueryProlog& prolog) 
 
 void XQueryPrologItemDefaultBaseURI::XQueryUpdateProlog(XQueryProlog& prolog) {
   if (prolog.baseURI()) {
-    addItemError(prolog, 32, "base-uri already defined for ", *this);
+    addItemError(prolog, XQueryErrors::baseURIDefined, *this);
   } else {
     prolog.setBaseURI(_baseURI);
   }
@@ -101,10 +101,9 @@ void XQueryPrologItemDeclareNamespace::XQueryUpdateProlog(XQueryProlog& prolog) 
   int64_t boundID = prolog.namespaceIDForPrefix(_prefix->view());
   if (boundID == XQueryNamespaceNone && _prefix->view() == "xmlns") boundID = XQueryNamespaceXmlns;
   if (boundID >= XQueryNamespaceFirstUser) {
-    addItemError(prolog, 33, "invalid resuse of prefix for ", *this);
+    addItemError(prolog, XQueryErrors::prefixReused, *this);
   } else if (boundID == XQueryNamespaceXML || boundID == XQueryNamespaceXmlns) {
-    prolog.addError(
-        XQueryError::error(70, messageText("prefix ", _prefix, " can't be redeclared")));
+    prolog.addError(XQueryErrors::reservedPrefix.error(_prefix));
   } else {
     prolog.addNamespace(_namespaceString, _prefix);
   }
@@ -112,7 +111,7 @@ void XQueryPrologItemDeclareNamespace::XQueryUpdateProlog(XQueryProlog& prolog) 
 
 void XQueryPrologItemDefaultElementNamespace::XQueryUpdateProlog(XQueryProlog& prolog) {
   if (_namespaceString->length() == 0) {
-    addItemError(prolog, 46, "invalid namespace uri for ", *this);
+    addItemError(prolog, XQueryErrors::invalidNamespaceURI, *this);
   } else {
     prolog.setDefaultElementNamespace(_namespaceString);
   }
@@ -120,7 +119,7 @@ void XQueryPrologItemDefaultElementNamespace::XQueryUpdateProlog(XQueryProlog& p
 
 void XQueryPrologItemDefaultFunctionNamespace::XQueryUpdateProlog(XQueryProlog& prolog) {
   if (_namespaceString->length() == 0) {
-    addItemError(prolog, 46, "invalid namespace uri for ", *this);
+    addItemError(prolog, XQueryErrors::invalidNamespaceURI, *this);
   } else {
     prolog.setDefaultFunctionNamespace(_namespaceString);
   }
@@ -131,13 +130,13 @@ void XQueryPrologItemVariableDeclaration::XQueryUpdateProlog(XQueryProlog& prolo
   Ref<NSString> localPart;
   XQueryQName::parseQNameString(_varName, prefix, localPart);
   if (prolog.isModule() && !isInModuleNamespace(prolog, prefix)) {
-    addItemError(prolog, 48, "invalid variable declaration for ", *this);
+    addItemError(prolog, XQueryErrors::variableOutsideModule, *this);
     return;
   }
   const auto qName = XQueryQName::qname(localPart, prolog.namespaceForPrefix(prefix->view()));
   if (!qName) return;
   if (prolog.variableInfoForQName(qName)) {
-    addItemError(prolog, 49, "invalid variable declaration for ", *this);
+    addItemError(prolog, XQueryErrors::variableDeclaredTwice, *this);
     return;
   }
   prolog.setVariableInfo(XQueryVarDecl::varDecl(qName, _type, _expr, prolog), qName);
@@ -150,14 +149,14 @@ void XQueryPrologItemFunctionDeclaration::XQueryUpdateProlog(XQueryProlog& prolo
   Ref<NSString> URI;
   if (prolog.isModule()) {
     if (!isInModuleNamespace(prolog, prefix)) {
-      addItemError(prolog, 48, "invalid function declaration for ", *this);
+      addItemError(prolog, XQueryErrors::functionOutsideModule, *this);
       return;
     }
     URI = prolog.namespaceForPrefix(prefix->view());
   } else {
     const int64_t id = prolog.namespaceIDForPrefix(prefix->view());
     if (!mayDeclareFunctionsIn(prolog, id)) {
-      addItemError(prolog, 45, "invalid function declaration for ", *this);
+      addItemError(prolog, XQueryErrors::functionInReservedNamespace, *this);
       return;
     }
     URI = prolog.namespaceForID(id);
@@ -166,7 +165,7 @@ void XQueryPrologItemFunctionDeclaration::XQueryUpdateProlog(XQueryProlog& prolo
   if (!qName) return;
   const XQueryFunctionSignature signature(qName, _paramList.size());
   if (prolog.functionInfoForSignature(signature)) {
-    addItemError(prolog, 34, "invalid function declaration for ", *this);
+    addItemError(prolog, XQueryErrors::functionDeclaredTwice, *this);
     return;
   }
   prolog.setFunctionInfo(XQueryFunctionDecl::functionDecl(qName, _type, _paramList, _expr, prolog),

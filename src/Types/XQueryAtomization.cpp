@@ -1,6 +1,7 @@
 #include "Types/XQueryAtomization.h"
 
 #include "Eval/XQueryContextInternal.h"
+#include "Types/XQueryErrors.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryNumber.h"
 #include "xquery/Collection.h"
@@ -11,7 +12,7 @@ namespace xquery {
 namespace {
 
 [[noreturn]] void raiseWrongCount(XQueryContext& context) {
-  context._internal().raise(XQueryError::error(6, "invalid type for automization"));
+  context._internal().raise(XQueryErrors::invalidAtomization.error());
 }
 
 bool allAtomic(const std::vector<Value>& items) {
@@ -68,7 +69,7 @@ bool effectiveBooleanValueOfItem(const NSObject& item) {
 Value XQueryTypedValue(const Value& item, XQueryContext& context) {
   if (XQueryIsNode(item.get())) return XQueryNodeTypedValue(cast<NSXMLNode>(item));
   if (XQueryIsAtomicType(item.get())) return item;
-  context._internal().raise(XQueryError::error(6, "invalid type"));
+  context._internal().raise(XQueryErrors::invalidType.error());
 }
 
 Value XQueryAtomization(const Value& value, XQueryContext& context) {

@@ -7,6 +7,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryBinary.h"
+#include "Types/XQueryErrors.h"
 #include "Types/XQueryNotation.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryQName.h"
@@ -59,8 +60,7 @@ Value textToTarget(const Cast& cast) {
 }
 
 Value toMissingType(const Cast& cast) {
-  cast.context._internal().raise(
-      XQueryError::error(6, "dates, times and durations are not available in this build"));
+  cast.context._internal().raise(XQueryErrors::unavailableType.error());
 }
 
 // --- from strings --------------------------------------------------------------------------------
@@ -425,7 +425,7 @@ bool answersItself(Source source) {
 Value XQueryCastAs(const Value& object, XQueryTypeID type, XQueryContext& forContext) {
   const Source source = sourceOf(object.get());
   if (source == Source::None) {
-    forContext._internal().raise(XQueryError::error(6, "invalid type conversion"));
+    forContext._internal().raise(XQueryErrors::invalidConversion.error());
   }
   if (answersItself(source) && XQueryObjectTypeID(object.get()) == type) return object;
   const auto primitive = static_cast<size_t>(XQueryPrimitiveTypeForTypeID(type));
@@ -434,7 +434,7 @@ Value XQueryCastAs(const Value& object, XQueryTypeID type, XQueryContext& forCon
   if (function) {
     if (Value result = function({object, type, forContext})) return result;
   }
-  Ref<XQueryError> error = XQueryError::error(6, "value does not match a required type");
+  Ref<XQueryError> error = XQueryErrors::valueOfAnotherType.error();
   // Of a URI the error is the answer and travels on as an item; no other class does this.
   if (source == Source::AnyURI) return error;
   forContext._internal().raise(std::move(error));

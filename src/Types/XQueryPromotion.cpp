@@ -2,6 +2,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
+#include "Types/XQueryErrors.h"
 #include "Types/XQueryTypeTable.h"
 #include "Types/XQueryValues.h"
 #include "xquery/XQuery.h"
@@ -10,11 +11,9 @@ namespace xquery {
 
 namespace {
 
-[[noreturn]] void raiseWrongKind(const char* text, const Value& argument, XQueryContext& context) {
-  NSMutableString message;
-  message.appendASCII(text);
-  message.append(XQueryDescription(argument.get())->view());
-  context._internal().raise(XQueryError::error(6, message.string()));
+[[noreturn]] void raiseWrongKind(const XQueryErrorText<1>& text, const Value& argument,
+                                 XQueryContext& context) {
+  context._internal().raise(text.error(XQueryDescription(argument.get())));
 }
 
 // The list type IDREFS passes for a string here, the other two list types do not.
@@ -37,7 +36,7 @@ Value XQueryPromoteToString(const Value& value, XQueryContext& context) {
     string = XQueryCastAsTypeForContext(NSString::empty(), XQueryTypeString, context);
   }
   if (string) return string;
-  raiseWrongKind("not a string type - ", value, context);
+  raiseWrongKind(XQueryErrors::notAString, value, context);
 }
 
 Value XQueryPromoteToNumeric(const Value& value, XQueryContext& context) {
@@ -51,7 +50,7 @@ Value XQueryPromoteToNumeric(const Value& value, XQueryContext& context) {
     case XQueryTypeUntypedAtomic:
       return XQueryCastAsTypeForContext(item, XQueryTypeDouble, context);
     default:
-      raiseWrongKind("not a numeric type - ", value, context);
+      raiseWrongKind(XQueryErrors::notANumber, value, context);
   }
 }
 
@@ -74,7 +73,7 @@ Value XQueryPromoteToInteger(const Value& value, XQueryContext& context) {
       break;
   }
   if (integer) return integer;
-  raiseWrongKind("not a integer type - ", value, context);
+  raiseWrongKind(XQueryErrors::notAnInteger, value, context);
 }
 
 }  // namespace xquery

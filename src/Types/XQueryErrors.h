@@ -1,0 +1,140 @@
+// The catalogue of errors: the number and the text of every failure that the engine reports, one
+// row each. Whoever reports one names its row:
+//
+//   context.raise(XQueryErrors::undefinedVariable.errorAtLine(exprLine(), _name));
+//
+// The type of a row counts the "%@" of its text, so that a row given too few or too many parts does
+// not compile. A number is that of the language's own error code; 0 stands for what has none, such
+// as the limits of the engine. Odd spellings are what callers look for: keep them.
+#pragma once
+
+#include "Types/MessageText.h"
+#include "xquery/Error.h"
+#include "xquery/String.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <string_view>
+
+namespace xquery {
+
+template <size_t places = 0>
+struct XQueryErrorText {
+  int64_t number;
+  std::string_view text;  // ASCII
+
+  consteval XQueryErrorText(int64_t withNumber, std::string_view withText)
+      : number(withNumber), text(withText) {
+    size_t found = 0;
+    for (size_t at = text.find("%@"); at != text.npos; at = text.find("%@", at + 2)) ++found;
+    if (found != places) throw "the text has another number of places to fill";
+  }
+
+  template <class... Parts>
+  requires(sizeof...(Parts) == places) Ref<NSString> message(const Parts&... parts)
+  const { return filledText(text, parts...); }
+  // An error without a line.
+  template <class... Parts>
+  requires(sizeof...(Parts) == places)
+      [[nodiscard]] Ref<XQueryError> error(const Parts&... parts) const {
+    return XQueryError::error(number, message(parts...));
+  }
+  // The line counts from 0.
+  template <class... Parts>
+  requires(sizeof...(Parts) == places)
+      [[nodiscard]] Ref<XQueryError> errorAtLine(int64_t line, const Parts&... parts) const {
+    return XQueryError::error(number, message(parts...), line);
+  }
+};
+
+namespace XQueryErrors {
+
+// --- limits --------------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<> nestedTooDeeply{0, "limit: expression nested too deeply"};
+inline constexpr XQueryErrorText<> outOfMemory{0, "limit: out of memory"};
+inline constexpr XQueryErrorText<> rangeTooLong{0, "limit: range of too many items"};
+
+// --- parsing -------------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<1> unavailableConstruct{0, "%@ are not available in this build"};
+inline constexpr XQueryErrorText<> notUTF8{3, "the query is not well-formed UTF-8"};
+inline constexpr XQueryErrorText<2> scannerError{3, "%@ - %@"};
+inline constexpr XQueryErrorText<3> invalidToken{3, "%@ invalid token (%@)- %@"};
+inline constexpr XQueryErrorText<1> parserFailure{3, "%@"};
+inline constexpr XQueryErrorText<2> mustUnderstandExtension{
+    14, "must-understand extension not supported (%@ %@)"};
+
+// --- the prolog ----------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<1> unsupportedVersion{31, "version \"%@\" not supported"};
+inline constexpr XQueryErrorText<1> baseURIDefined{32, "base-uri already defined for %@"};
+inline constexpr XQueryErrorText<> secondBaseURI{
+    32, "Prolog contains more than one base URI declaration"};
+inline constexpr XQueryErrorText<1> prefixReused{33, "invalid resuse of prefix for %@"};
+inline constexpr XQueryErrorText<1> functionDeclaredTwice{34,
+                                                          "invalid function declaration for %@"};
+inline constexpr XQueryErrorText<1> duplicateVariable{37, "duplicate definition of variable %@"};
+inline constexpr XQueryErrorText<1> duplicateFunction{37, "duplicate definition of function %@"};
+inline constexpr XQueryErrorText<> secondDefaultCollation{
+    38, "Prolog contains more than one default collation declaration"};
+inline constexpr XQueryErrorText<> duplicateParameter{39,
+                                                      "more than one parameter with the same name"};
+inline constexpr XQueryErrorText<1> functionInReservedNamespace{
+    45, "invalid function declaration for %@"};
+inline constexpr XQueryErrorText<1> invalidNamespaceURI{46, "invalid namespace uri for %@"};
+inline constexpr XQueryErrorText<1> moduleNotFound{47, "can't access module for %@"};
+inline constexpr XQueryErrorText<1> variableOutsideModule{48,
+                                                          "invalid variable declaration for %@"};
+inline constexpr XQueryErrorText<1> functionOutsideModule{48,
+                                                          "invalid function declaration for %@"};
+inline constexpr XQueryErrorText<1> variableDeclaredTwice{49,
+                                                          "invalid variable declaration for %@"};
+inline constexpr XQueryErrorText<> secondInheritNamespaces{
+    55, "Prolog contains more than one inherit-namespaces declaration"};
+inline constexpr XQueryErrorText<> secondOrderingMode{
+    65, "Prolog contains more than one ordering mode declaration"};
+inline constexpr XQueryErrorText<> secondConstruction{
+    67, "Prolog contains more than one construction declaration"};
+inline constexpr XQueryErrorText<> secondXMLSpace{
+    68, "Prolog contains more than one xmlspace declaration"};
+inline constexpr XQueryErrorText<> secondEmptyOrdering{
+    69, "Prolog contains more than one empty ordering declaration"};
+inline constexpr XQueryErrorText<1> reservedPrefix{70, "prefix %@ can't be redeclared"};
+
+// --- names and variables -------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<1> unresolvedQName{1, "can't resolve QName for \"%@\""};
+inline constexpr XQueryErrorText<1> undefinedVariable{8, "reference to undefined variable \"%@\""};
+inline constexpr XQueryErrorText<1> unresolvedExternalVariable{16,
+                                                               "unresloved external variable - %@"};
+inline constexpr XQueryErrorText<1> unresolvedExternalFunction{16,
+                                                               "unresloved external function - %@"};
+
+// --- types ---------------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<> invalidType{6, "invalid type"};
+inline constexpr XQueryErrorText<> invalidConversion{6, "invalid type conversion"};
+inline constexpr XQueryErrorText<> invalidOperand{6, "invalid type for operator"};
+inline constexpr XQueryErrorText<> invalidAtomization{6, "invalid type for automization"};
+inline constexpr XQueryErrorText<1> notAString{6, "not a string type - %@"};
+inline constexpr XQueryErrorText<1> notANumber{6, "not a numeric type - %@"};
+inline constexpr XQueryErrorText<1> notAnInteger{6, "not a integer type - %@"};
+inline constexpr XQueryErrorText<> valueOfAnotherType{6, "value does not match a required type"};
+inline constexpr XQueryErrorText<> unavailableType{
+    6, "dates, times and durations are not available in this build"};
+
+// --- arithmetic ----------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<> divideByZero{6, "divide by zero"};
+inline constexpr XQueryErrorText<> divisionByZero{6, "Division by zero"};
+
+// --- paths ---------------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<> itemNotANode{19, "item not a node"};
+inline constexpr XQueryErrorText<> itemNotAtomic{19, "item not an atomic typ"};
+inline constexpr XQueryErrorText<> itemNotANodeOrAtomic{19, "item not a node or atomic type"};
+inline constexpr XQueryErrorText<> contextItemNotANode{20, "context item not a node"};
+
+}  // namespace XQueryErrors
+}  // namespace xquery
