@@ -2,10 +2,10 @@
 #include "xquery/XQuery.h"
 
 #include "Eval/XQueryContextInternal.h"
+#include "Eval/XQueryGlobals.h"
 #include "Eval/XQueryInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/NSLog.h"
-#include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryValues.h"
@@ -78,55 +78,6 @@ void XQueryContext::_traceValue(const Value& value, const Ref<NSString>& forLabe
 
 namespace {
 
-[[noreturn]] void raiseUnresolved(const XQueryErrorText<1>& text, const XQueryQName& name,
-                                  XQueryContextInternal& context) {
-  context.raise(text.error(name.XQueryStringValue()));
-}
-
-void setConstants(const XQueryConstants& constants, const XQueryProlog& prolog,
-                  XQueryContextInternal& context) {
-  for (const auto& [name, value] : constants) {
-    const auto text = NSString::stringWithUTF8(name);
-    if (!text || !value) continue;
-    if (const auto qName = prolog.variableQNameFromString(text)) context.setGlobal(value, qName);
-  }
-}
-
-void evaluateVariable(const XQueryVarDecl& declaration, XQueryContext& publicContext) {
-  auto& context = publicContext._internal();
-  if (declaration.isExternal()) {
-    if (!context.globalForQName(*declaration.name())) {
-      raiseUnresolved(XQueryErrors::unresolvedExternalVariable, *declaration.name(), context);
-    }
-    return;
-  }
-  // The initializer sees the static context of the module that declared it.
-  XQueryProlog* const prolog = context.activeProlog();
-  const bool ordered = context.ordered();
-  context.setActiveProlog(&declaration.prolog());
-  context.setOrdered(declaration.prolog().ordered());
-  const Value value = declaration.expr()->evaluateWithContext(publicContext);
-  context.setActiveProlog(prolog);
-  context.setOrdered(ordered);
-  if (!value)
-    raiseUnresolved(XQueryErrors::unresolvedExternalVariable, *declaration.name(), context);
-  context.setGlobal(value, declaration.name());
-}
-
-void evaluateDeclarations(const XQueryProlog& prolog, XQueryContext& context) {
-  for (const Value& declaration : prolog.declarations()) {
-    if (const auto* variable = dyn_cast<XQueryVarDecl>(declaration)) {
-      evaluateVariable(*variable, context);
-    } else if (const auto* function = dyn_cast<XQueryFunctionDecl>(declaration)) {
-      if (function->isExternal() &&
-          !context._internal().XQueryExternalFunctionForQName(*function->name())) {
-        raiseUnresolved(XQueryErrors::unresolvedExternalFunction, *function->name(),
-                        context._internal());
-      }
-    }
-  }
-}
-
 // Marks the first result with the base URI that its construction recorded.
 void decorateWithBaseURI(const NSArray& items, const XQueryContextInternal& context) {
   NSObject* first = items.objectAtIndex(0);
@@ -158,8 +109,8 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   context.setActiveProlog(&prolog);
   Value result;
   try {
-    setConstants(constants, prolog, context);
-    evaluateDeclarations(prolog, *this);
+    XQuerySetConstants(constants, prolog, *this);
+    XQueryEvaluateDeclarations(prolog, *this);
     if (compiled.body()) result = compiled.body()->evaluateWithContext(*this);
   } catch (const NSException&) {
     result = context.error();

@@ -33,7 +33,9 @@ void XQueryContextInternal::setGlobal(const Value& value, const Ref<XQueryQName>
   _globals[forQName] = value;
 }
 
-void XQueryContextInternal::_clearGlobals() { _globals.clear(); }
+void XQueryContextInternal::_clearGlobals() {
+  _globals.clear();
+}
 
 Ref<NSString> XQueryContextInternal::namespaceForPrefix(NSStringView prefix) const {
   return _prolog ? _prolog->namespaceForPrefix(prefix) : Ref<NSString>();
@@ -69,6 +71,7 @@ void XQueryContextInternal::popInScopeNamespaces() {
 }
 
 Ref<NSString> XQueryContextInternal::firstPrefixForNamespace(const Ref<NSString>& URI) const {
+  if (!URI) return {};
   for (auto entry = _inScopeNamespaces.rbegin(); entry != _inScopeNamespaces.rend(); ++entry) {
     for (const auto& node : *entry) {
       if (node->textView() == URI->view()) return node->name();
@@ -113,9 +116,10 @@ void XQueryContextInternal::setError(Ref<XQueryError> error, bool raiseException
   const Ref<NSString> reason = _error ? _error->description() : Ref<NSString>();
   if (!XQueryLogEnabled()) throw NSException("XQueryError", reason);
   // With diagnostics on the failure goes through the assertion handler, which logs and throws.
-  NSLog("*** Assertion failure in -[XQueryContextInternal setError:raiseException:], "
-        "Eval/XQueryContextInternal:288: " +
-        (reason ? reason->utf8() : std::string("(null)")));
+  NSLog(
+      "*** Assertion failure in -[XQueryContextInternal setError:raiseException:], "
+      "Eval/XQueryContextInternal:288: " +
+      (reason ? reason->utf8() : std::string("(null)")));
   throw NSException("NSInternalInconsistencyException", reason);
 }
 
@@ -124,6 +128,8 @@ void XQueryContextInternal::raise(Ref<XQueryError> error) {
   __builtin_unreachable();
 }
 
-Value XQueryContextInternal::XQueryExternalFunctionForQName(const XQueryQName&) const { return {}; }
+Value XQueryContextInternal::XQueryExternalFunctionForQName(const XQueryQName&) const {
+  return {};
+}
 
 }  // namespace xquery

@@ -2,17 +2,17 @@
 // error and what is kept from one evaluation to the next.
 #pragma once
 
-#include <map>
-#include <memory>
-#include <string>
-#include <unordered_map>
-#include <vector>
-
 #include "Types/XQueryQName.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/XMLNode.h"
 #include "xquery/XQuery.h"
+
+#include <map>
+#include <memory>
+#include <string>
+#include <unordered_map>
+#include <vector>
 
 namespace xquery {
 

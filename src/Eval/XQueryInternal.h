@@ -1,11 +1,11 @@
 // A compiled query: prolog, body and the errors found while compiling.
 #pragma once
 
-#include <vector>
-
 #include "Expr/XQueryExpr.h"
 #include "xquery/Error.h"
 #include "xquery/String.h"
+
+#include <vector>
 
 namespace xquery {
 

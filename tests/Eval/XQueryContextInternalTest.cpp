@@ -1,19 +1,22 @@
 #include "Eval/XQueryContextInternal.h"
-
-#include <gtest/gtest.h>
-
-#include <cstdlib>
-
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
 #include "xquery/Collection.h"
 
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+
 namespace xquery {
 namespace {
 
-Ref<NSString> text(std::string_view ascii) { return NSString::stringWithASCII(ascii); }
-Ref<XQueryQName> name(std::string_view local) { return XQueryQName::qname(text(local), nullptr); }
+Ref<NSString> text(std::string_view ascii) {
+  return NSString::stringWithASCII(ascii);
+}
+Ref<XQueryQName> name(std::string_view local) {
+  return XQueryQName::qname(text(local), nullptr);
+}
 
 class DynamicContext : public testing::Test {
  protected:
@@ -59,6 +62,21 @@ TEST_F(DynamicContext, AnInstalledFrameHidesTheOldOneUntilItIsPutBack) {
   context.setVariable(text("inner"), 1);
   context._setInScopeVariables(saved);
   EXPECT_EQ(static_cast<NSString*>(context.variableForID(1))->utf8(), "outer");
+}
+
+TEST_F(DynamicContext, SettingAnIDAgainReplacesItsValueOnly) {
+  context.setVariable(text("a"), 1);
+  context.setVariable(text("b"), 2);
+  context.setVariable(text("c"), 1);
+  EXPECT_EQ(static_cast<NSString*>(context.variableForID(1))->utf8(), "c");
+  EXPECT_EQ(static_cast<NSString*>(context.variableForID(2))->utf8(), "b");
+}
+
+TEST_F(DynamicContext, GlobalsOfOneLocalPartAreKeptApartByNamespace) {
+  context.setGlobal(text("v"), XQueryQName::qname(text("x"), text("urn:a")));
+  EXPECT_EQ(context.globalForQName(*name("x")), nullptr);
+  EXPECT_EQ(context.globalForQName(*XQueryQName::qname(text("x"), text("urn:b"))), nullptr);
+  EXPECT_TRUE(context.globalForQName(*XQueryQName::qname(text("x"), text("urn:a"))));
 }
 
 TEST_F(DynamicContext, GlobalsAreKeptByNameUntilCleared) {
@@ -110,6 +128,63 @@ TEST_F(DynamicContext, SinglePrologPrefixIsAnswered) {
   context.setActiveProlog(prolog.get());
   EXPECT_EQ(context.firstPrefixForNamespace(text("urn:u"))->utf8(), "p");
   context.setActiveProlog(nullptr);
+}
+
+TEST_F(DynamicContext, BuiltinNamespacesHaveTheShiftedPrefixes) {
+  const auto prolog = XQueryProlog::prologWithItems({}, nullptr, nullptr, nullptr);
+  context.setActiveProlog(prolog.get());
+  EXPECT_EQ(context.firstPrefixForNamespace(text("http://www.w3.org/2001/XMLSchema"))->utf8(),
+            "xsi");
+  EXPECT_EQ(
+      context.firstPrefixForNamespace(text("http://www.w3.org/2004/10/xpath-functions"))->utf8(),
+      "xdt");
+  EXPECT_FALSE(context.firstPrefixForNamespace(text("http://www.w3.org/1999/xhtml")));
+  context.setActiveProlog(nullptr);
+}
+
+TEST_F(DynamicContext, NoNamespaceHasNoPrefix) {
+  const auto prolog = XQueryProlog::prologWithItems({}, nullptr, nullptr, nullptr);
+  context.setActiveProlog(prolog.get());
+  context.pushInScopeNamespaces(
+      {NSXMLNode::namespaceWithName(NSStringView::ascii("p"), NSStringView::ascii("urn:u"))});
+  EXPECT_FALSE(context.firstPrefixForNamespace(nullptr));
+  context.setActiveProlog(nullptr);
+}
+
+TEST_F(DynamicContext, PoppingAnEmptyStackDoesNothing) {
+  context.popInScopeNamespaces();
+  EXPECT_FALSE(context.firstPrefixForNamespace(text("urn:u")));
+}
+
+TEST_F(DynamicContext, StaticQuestionsGoToTheActiveProlog) {
+  const auto prolog = XQueryProlog::prologWithItems({}, nullptr, nullptr, nullptr);
+  prolog->addPrefix(text("p"), text("urn:p"));
+  prolog->setDefaultElementNamespace(text("urn:e"));
+  prolog->setDefaultCollation(text("urn:c"));
+  prolog->setBaseURI(text("http://b/"));
+  prolog->setXMLSpacePreserve(true);
+  context.setActiveProlog(prolog.get());
+  bool fromProlog = false;
+  EXPECT_EQ(context.namespaceForPrefix(NSStringView::ascii("p"))->utf8(), "urn:p");
+  EXPECT_EQ(context.namespaceForPrefix(NSStringView::ascii("p"), fromProlog)->utf8(), "urn:p");
+  EXPECT_TRUE(fromProlog);
+  EXPECT_FALSE(context.namespaceForPrefix(NSStringView::ascii("q")));
+  EXPECT_EQ(context.defaultElementNamespace()->utf8(), "urn:e");
+  EXPECT_EQ(context.defaultCollation()->utf8(), "urn:c");
+  EXPECT_EQ(context.baseURI()->utf8(), "http://b/");
+  EXPECT_TRUE(context.xmlSpacePreserve());
+  context.setActiveProlog(nullptr);
+  EXPECT_FALSE(context.namespaceForPrefix(NSStringView::ascii("p")));
+  EXPECT_FALSE(context.baseURI());
+  EXPECT_FALSE(context.xmlSpacePreserve());
+}
+
+TEST_F(DynamicContext, ALaterBaseURIReplacesTheOneBefore) {
+  const auto element = NSXMLElement::elementWithName(NSStringView::ascii("a"));
+  context.setBaseURI(text("http://a/"), element.get());
+  context.setBaseURI(text("http://b/"), element.get());
+  EXPECT_EQ(context.baseURINodeCount(), 1U);
+  EXPECT_EQ(context.baseURIForNode(element.get())->utf8(), "http://b/");
 }
 
 TEST_F(DynamicContext, BaseURINeedsBothParts) {

@@ -1,10 +1,4 @@
 // The compiled query and the evaluation driver, seen through the exported classes.
-#include "xquery/XQuery.h"
-
-#include <gtest/gtest.h>
-
-#include <cstdlib>
-
 #include "Eval/XQueryContextInternal.h"
 #include "Eval/XQueryInternal.h"
 #include "Expr/XQueryLeaves.h"
@@ -13,11 +7,37 @@
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
 #include "xquery/XMLNode.h"
+#include "xquery/XQuery.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <functional>
+#include <stdexcept>
+#include <vector>
 
 namespace xquery {
 namespace {
 
-Ref<NSString> text(std::string_view ascii) { return NSString::stringWithASCII(ascii); }
+Ref<NSString> text(std::string_view ascii) {
+  return NSString::stringWithASCII(ascii);
+}
+
+// An expression that does what the test says when it is evaluated.
+class Body : public XQueryExpr {
+ public:
+  explicit Body(std::function<Value(XQueryContextInternal&)> work)
+      : XQueryExpr(Kind::OtherExpr), _work(std::move(work)) {}
+  void bindInfoForProlog(XQueryProlog&) override {}
+  Value evaluateWithContext(XQueryContext& context) const override {
+    return _work(context._internal());
+  }
+
+ private:
+  std::function<Value(XQueryContextInternal&)> _work;
+};
+
+using Items = std::vector<Ref<XQueryPrologItem>>;
 
 class Driver : public testing::Test {
  protected:
@@ -26,6 +46,14 @@ class Driver : public testing::Test {
                         const Value& item = Value()) {
     query = XQuery::xqueryWithSource(source);
     return context->evaluateXQuery(*query, constants, item, &error);
+  }
+  // A query whose body is the given expression.
+  Ref<NSArray> evaluateBody(std::function<Value(XQueryContextInternal&)> work,
+                            const Items& items = {}, const Value& item = Value()) {
+    query = make<XQuery>(std::make_unique<XQueryInternal>(
+        XQueryProlog::prologWithItems(items, nullptr, nullptr, nullptr),
+        make<Body>(std::move(work))));
+    return context->evaluateXQuery(*query, {}, item, &error);
   }
   // A query whose body is one literal.
   Ref<NSArray> evaluateLiteral(const Value& value) {
@@ -233,6 +261,94 @@ TEST_F(Driver, WithoutAContextItemAnAbsolutePathFails) {
   EXPECT_EQ(error->msg()->utf8(), "context item not a node");
 }
 
+TEST_F(Driver, AContextItemIsGivenPositionOneAndLastIsLeftAlone) {
+  context->_internal().setContextItem(text("old"), 7);
+  context->_internal().setLast(9);
+  int64_t position = 0;
+  int64_t last = 0;
+  const auto look = [&](XQueryContextInternal& dynamic) {
+    position = dynamic.position();
+    last = dynamic.last();
+    return dynamic.contextItem();
+  };
+  EXPECT_EQ(strings(evaluateBody(look)), "old");
+  EXPECT_EQ(position, 7);
+  EXPECT_EQ(strings(evaluateBody(look, {}, text("new"))), "new");
+  EXPECT_EQ(position, 1);
+  EXPECT_EQ(last, 9);
+}
+
+TEST_F(Driver, TheBodySeesThePrologAndItsOrderingMode) {
+  for (const bool ordered : {false, true}) {
+    EXPECT_TRUE(evaluateBody(
+        [&](XQueryContextInternal& dynamic) {
+          EXPECT_EQ(dynamic.activeProlog(), query->_internal().prolog());
+          EXPECT_EQ(dynamic.ordered(), ordered);
+          return Value(NSNull::null());
+        },
+        {XQueryPrologItemOrdered::ordered(ordered, 0)}));
+  }
+}
+
+TEST_F(Driver, GlobalsAreClearedAfterSuccessAndAfterAnError) {
+  const auto name = XQueryQName::qname(text("x"), nullptr);
+  EXPECT_TRUE(evaluate("declare variable $x := 1; $x"));
+  EXPECT_EQ(context->_internal().globalForQName(*name), nullptr);
+  EXPECT_FALSE(evaluate("declare variable $x := 1; $nowhere"));
+  EXPECT_EQ(context->_internal().globalForQName(*name), nullptr);
+}
+
+TEST_F(Driver, AVariableWithoutAValueIsUnresolved) {
+  EXPECT_FALSE(evaluate("declare variable $x := .; 1"));
+  ASSERT_TRUE(error);
+  EXPECT_EQ(error->err(), 16);
+  EXPECT_EQ(error->msg()->utf8(), "unresloved external variable - x");
+}
+
+TEST_F(Driver, AnExceptionWithoutAnErrorAnswersNothing) {
+  const auto fail = [](XQueryContextInternal&) -> Value {
+    throw NSException("AnyName", text("reason"));
+  };
+  EXPECT_FALSE(evaluateBody(fail));
+  EXPECT_FALSE(error);
+}
+
+TEST_F(Driver, AnExceptionWithoutAnErrorHandsOutTheLastOne) {
+  EXPECT_FALSE(evaluate("$nowhere"));
+  const auto earlier = error;
+  const auto fail = [](XQueryContextInternal&) -> Value {
+    throw NSException("AnyName", text("reason"));
+  };
+  EXPECT_FALSE(evaluateBody(fail));
+  EXPECT_EQ(error, earlier);
+}
+
+TEST_F(Driver, OtherExceptionsPassThrough) {
+  const auto fail = [](XQueryContextInternal&) -> Value { throw std::runtime_error("host"); };
+  EXPECT_THROW(static_cast<void>(evaluateBody(fail)), std::runtime_error);
+}
+
+TEST_F(Driver, RunningOutOfMemoryIsALimit) {
+  const auto fail = [](XQueryContextInternal&) -> Value { throw std::bad_alloc(); };
+  EXPECT_FALSE(evaluateBody(fail));
+  ASSERT_TRUE(error);
+  EXPECT_EQ(error->err(), 0);
+  EXPECT_EQ(error->msg()->utf8(), "limit: out of memory");
+}
+
+TEST_F(Driver, ParseErrorsAreAFreshArrayEachTime) {
+  const auto bad = XQuery::xqueryWithSource("1 +");
+  const auto first = bad->parseErrors();
+  first->objects().clear();
+  EXPECT_NE(bad->parseErrors(), first);
+  EXPECT_GE(bad->parseErrors()->count(), 1U);
+}
+
+TEST_F(Driver, LocalVariableIDsOfTheBodyStartAtOne) {
+  EXPECT_TRUE(evaluate("declare function local:f($a, $b) { $a }; 1"));
+  EXPECT_EQ(query->_internal().prolog()->nextLocalVariableID(), 1);
+}
+
 TEST_F(Driver, RunTimeErrorComesWithNumberMessageAndLine) {
   EXPECT_FALSE(evaluate("\n\n$nowhere"));
   ASSERT_TRUE(error);
@@ -315,6 +431,31 @@ class RecordingClient : public XQueryClient {
   }
   std::string heard;
 };
+
+TEST_F(Driver, AClientMayBeReplacedAndTakenAway) {
+  const auto first = std::make_shared<RecordingClient>();
+  const auto second = std::make_shared<RecordingClient>();
+  context->contextSetClient(first);
+  context->contextSetClient(second);
+  EXPECT_EQ(first.use_count(), 1);
+  context->_traceValue(text("v"), text("l"));
+  EXPECT_EQ(first->heard + second->heard, "l=v;");
+  context->contextSetClient(nullptr);
+  context->_traceValue(text("w"), text("l"));
+  EXPECT_EQ(second->heard, "l=v;");
+  EXPECT_FALSE(context->contextClient());
+}
+
+TEST_F(Driver, AClientHearsAndNothingIsLogged) {
+  const auto client = std::make_shared<RecordingClient>();
+  context->contextSetClient(client);
+  setenv("XQUERY_LOG", "1", 1);
+  testing::internal::CaptureStderr();
+  context->_traceValue(text("v"), text("label"));
+  unsetenv("XQUERY_LOG");
+  EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+  EXPECT_EQ(client->heard, "label=v;");
+}
 
 TEST_F(Driver, TraceGoesToTheClient) {
   const auto client = std::make_shared<RecordingClient>();

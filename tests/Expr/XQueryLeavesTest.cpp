@@ -1,8 +1,5 @@
-#include "Expr/XQueryLeaves.h"
-
-#include <gtest/gtest.h>
-
 #include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Expr/XQuerySequence.h"
 #include "Prolog/XQueryModules.h"
@@ -12,15 +9,39 @@
 #include "Types/XQueryTypeTable.h"
 #include "Types/XQueryValues.h"
 
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <string>
+#include <vector>
+
 namespace xquery {
 namespace {
 
-Ref<NSString> text(std::string_view ascii) { return NSString::stringWithASCII(ascii); }
+Ref<NSString> text(std::string_view ascii) {
+  return NSString::stringWithASCII(ascii);
+}
 Ref<XQueryExpr> integer(std::string_view digits) {
   return XQueryLiteral::integerLiteralWithString(text(digits));
 }
-Ref<XQueryExpr> emptyLiteral() { return XQueryLiteral::literalWithValue(NSNull::null()); }
-std::string printed(const Value& value) { return XQueryStringValue(*value)->utf8(); }
+Ref<XQueryExpr> emptyLiteral() {
+  return XQueryLiteral::literalWithValue(NSNull::null());
+}
+std::string printed(const Value& value) {
+  return XQueryStringValue(*value)->utf8();
+}
+
+// An expression that tells when it is bound.
+class BindNote : public XQueryExpr {
+ public:
+  explicit BindNote(std::function<void()> onBind)
+      : XQueryExpr(Kind::OtherExpr), _onBind(std::move(onBind)) {}
+  void bindInfoForProlog(XQueryProlog&) override { _onBind(); }
+  Value evaluateWithContext(XQueryContext&) const override { return NSNull::null(); }
+
+ private:
+  std::function<void()> _onBind;
+};
 
 class Leaves : public testing::Test {
  protected:
@@ -124,6 +145,53 @@ TEST_F(Leaves, ListWhoseOnlyElementYieldsAOneElementArrayAnswersThatElement) {
   auto list = XQueryExprList::exprList();
   list->addObject(XQueryLiteral::literalWithValue(NSArray::arrayWithObjects({item})));
   EXPECT_EQ(evaluate(*list).get(), item.get());
+}
+
+TEST_F(Leaves, ElementsWithoutAValueAreSkippedByTheList) {
+  auto alone = XQueryExprList::exprList();
+  alone->addObject(XQueryContextItem::contextItem());
+  EXPECT_TRUE(isNull(evaluate(*alone)));
+  auto list = XQueryExprList::exprList();
+  list->addObject(XQueryContextItem::contextItem());
+  list->addObject(integer("1"));
+  list->addObject(XQueryContextItem::contextItem());
+  EXPECT_EQ(printed(evaluate(*list)), "1");
+}
+
+TEST_F(Leaves, EmptyArraysOfElementsAddNothingToTheList) {
+  auto list = XQueryExprList::exprList();
+  list->addObject(XQueryLiteral::literalWithValue(NSArray::array()));
+  EXPECT_TRUE(isNull(evaluate(*list)));
+  list->addObject(XQueryLiteral::literalWithValue(NSArray::array()));
+  EXPECT_TRUE(isNull(evaluate(*list)));
+  list->addObject(integer("1"));
+  EXPECT_EQ(printed(evaluate(*list)), "1");
+}
+
+TEST_F(Leaves, ListBindsItsElementsInOrder) {
+  std::string bound;
+  auto list = XQueryExprList::exprList();
+  for (const char name : {'a', 'b', 'c'}) {
+    list->addObject(make<BindNote>([&bound, name] { bound += name; }));
+  }
+  list->bindInfoForProlog(*prolog);
+  EXPECT_EQ(bound, "abc");
+}
+
+TEST_F(Leaves, RemovingAndReplacingInALongerList) {
+  auto list = XQueryExprList::exprList();
+  std::vector<Ref<XQueryExpr>> parts;
+  for (const char* digits : {"1", "2", "3", "4"}) {
+    parts.push_back(integer(digits));
+    list->addObject(parts.back());
+  }
+  list->removeObjectAtIndex(1);
+  list->removeLastObject();
+  list->replaceObjectAtIndex(1, parts[3]);
+  ASSERT_EQ(list->count(), 2U);
+  EXPECT_EQ(list->objectAtIndex(0), parts[0].get());
+  EXPECT_EQ(list->objectAtIndex(1), parts[3].get());
+  EXPECT_EQ(list->objectAtIndex(2), nullptr);
 }
 
 TEST_F(Leaves, AddingNoExpressionStoresAnEmptyLiteral) {
@@ -234,6 +302,24 @@ TEST_F(Leaves, UndefinedVariableIsNamedAsWritten) {
   EXPECT_EQ(error->msg()->utf8(), "reference to undefined variable \"nowhere:x\"");
 }
 
+TEST_F(Leaves, PrefixedVariableIsTheGlobalOfItsExpandedName) {
+  prolog->addPrefix(text("p"), text("urn:p"));
+  auto variable = XQueryVariable::variableWithName(text("p:x"));
+  variable->bindInfoForProlog(*prolog);
+  dynamic().setGlobal(text("other"), XQueryQName::qname(text("x"), nullptr));
+  EXPECT_TRUE(failure(*variable));
+  const Value value = text("v");
+  dynamic().setGlobal(value, XQueryQName::qname(text("x"), text("urn:p")));
+  EXPECT_EQ(evaluate(*variable).get(), value.get());
+}
+
+TEST_F(Leaves, LineIsZeroUntilSet) {
+  auto literal = integer("1");
+  EXPECT_EQ(literal->exprLine(), 0);
+  literal->setExprLine(3);
+  EXPECT_EQ(literal->exprLine(), 3);
+}
+
 TEST_F(Leaves, ContextItemIsOneSharedExpression) {
   EXPECT_EQ(XQueryContextItem::contextItem(), XQueryContextItem::contextItem());
   EXPECT_FALSE(evaluate(*XQueryContextItem::contextItem()));
@@ -264,6 +350,14 @@ TEST_F(Leaves, QNameReferenceWithoutPrefixHasNoNamespace) {
   const auto* qName = dyn_cast<XQueryQName>(value);
   ASSERT_TRUE(qName);
   EXPECT_FALSE(qName->namespaceURI());
+}
+
+TEST_F(Leaves, QNameReferenceWithoutPrefixTakesTheContextsDefaultNamespace) {
+  dynamic().addNamespace(text("urn:default"), NSString::empty());
+  const Value value = evaluate(*XQueryQNameReference::qNameReferenceWithString(text("a"), 0));
+  const auto* qName = dyn_cast<XQueryQName>(value);
+  ASSERT_TRUE(qName);
+  EXPECT_EQ(qName->namespaceURI()->utf8(), "urn:default");
 }
 
 TEST_F(Leaves, UnknownPrefixRaisesWithTheNameAndLine) {

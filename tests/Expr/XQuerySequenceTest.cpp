@@ -1,13 +1,14 @@
 #include "Expr/XQuerySequence.h"
+#include "xquery/String.h"
 
 #include <gtest/gtest.h>
-
-#include "xquery/String.h"
 
 namespace xquery {
 namespace {
 
-Value text(std::string_view ascii) { return NSString::stringWithASCII(ascii); }
+Value text(std::string_view ascii) {
+  return NSString::stringWithASCII(ascii);
+}
 
 std::string joined(const NSArray& array) {
   std::string all;
@@ -78,7 +79,9 @@ TEST(Normalised, OneElementArrayBecomesItsElement) {
   EXPECT_EQ(normalised(NSArray::arrayWithObjects({item})).get(), item.get());
 }
 
-TEST(Normalised, EmptyArrayBecomesNull) { EXPECT_TRUE(isNull(normalised(NSArray::array()))); }
+TEST(Normalised, EmptyArrayBecomesNull) {
+  EXPECT_TRUE(isNull(normalised(NSArray::array())));
+}
 
 TEST(Normalised, LongerArrayAndItemStay) {
   const Value two = NSArray::arrayWithObjects({text("a"), text("b")});
