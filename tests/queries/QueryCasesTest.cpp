@@ -11,6 +11,8 @@
 //   element()	<b/>
 //   -- error 6 line 1 invalid type for operator     (instead of a result; "line N" is optional,
 //                                                    "..." stands for any text)
+#include "xquery/xquery.h"
+
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -21,8 +23,6 @@
 #include <string>
 #include <string_view>
 #include <vector>
-
-#include "xquery/xquery.h"
 
 namespace xquery {
 namespace {
@@ -139,13 +139,11 @@ class QueryCase : public testing::Test {
       ASSERT_TRUE(error) << _case.file << ":" << _case.line << " expected an error";
       const bool withLine = _case.error.find(" line ") != std::string::npos;
       const std::string found = printedError(*error, withLine);
-      EXPECT_TRUE(matches(found, _case.error))
-          << _case.file << ":" << _case.line << "\n  found    " << found << "\n  expected "
-          << _case.error;
+      EXPECT_TRUE(matches(found, _case.error)) << _case.file << ":" << _case.line << "\n  found    "
+                                               << found << "\n  expected " << _case.error;
       return;
     }
-    ASSERT_FALSE(error) << _case.file << ":" << _case.line << " "
-                        << error->description()->utf8();
+    ASSERT_FALSE(error) << _case.file << ":" << _case.line << " " << error->description()->utf8();
     std::vector<std::string> lines;
     if (items) {
       for (const Value& item : items->objects()) lines.push_back(printed(*item));
@@ -206,7 +204,9 @@ TEST(QueryCases, ErrorPatternsMatchWhole) {
   EXPECT_FALSE(matches("ab", "ab...b"));
 }
 
-TEST(QueryCases, AreRead) { EXPECT_TRUE(registered); }
+TEST(QueryCases, AreRead) {
+  EXPECT_TRUE(registered);
+}
 
 }  // namespace
 }  // namespace xquery
