@@ -9,6 +9,7 @@
 #include <cstring>
 #include <fstream>
 #include <iterator>
+#include <string_view>
 
 namespace cli {
 namespace {
@@ -21,7 +22,9 @@ struct Stop {
 };
 
 [[noreturn]] void stop(Status status, const std::string& message) {
-  std::fprintf(stderr, "%s\n", message.c_str());
+  // A message may quote any character of the query, a zero included.
+  std::fwrite(message.data(), 1, message.size(), stderr);
+  std::fputc('\n', stderr);
   throw Stop{status};
 }
 
@@ -35,8 +38,14 @@ std::string readFile(const std::string& path) {
 }
 
 Ref<NSString> queryText(const Options& options) {
-  const Ref<NSString> text = NSString::stringWithUTF8(
-      options.queryText ? *options.queryText : readFile(options.queryFile));
+  const std::string bytes = options.queryText ? *options.queryText : readFile(options.queryFile);
+  std::string_view source = bytes;
+  // The signature that some editors put before UTF-8 belongs to the file, not to the query.
+  constexpr std::string_view signature = "\xEF\xBB\xBF";
+  if (!options.queryText && source.substr(0, signature.size()) == signature) {
+    source.remove_prefix(signature.size());
+  }
+  const Ref<NSString> text = NSString::stringWithUTF8(source);
   if (!text) {
     const std::string name = options.queryText ? "the query given with -e" : options.queryFile;
     stop(StatusInput, "xquery: " + name + ": not UTF-8 text");

@@ -22,6 +22,11 @@ TEST(Options, TheQueryComesFromAFile) {
             "<title>A Field Guide to Lichens</title>\n<title>Brücken &amp; Wege</title>\n");
 }
 
+TEST(Options, AQueryFileMayBeginWithAnEncodingSignature) {
+  const TemporaryDirectory directory;
+  EXPECT_EQ(xquery({directory.write("q.xq", "\xEF\xBB\xBF 1 + 1")}).out, "2\n");
+}
+
 TEST(Options, TheQueryMayBeginLikeAnOption) {
   EXPECT_EQ(xquery({"-e", "-1"}).out, "-1\n");
 }
