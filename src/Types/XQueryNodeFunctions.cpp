@@ -3,6 +3,7 @@
 
 #include "Types/XQueryNumber.h"
 
+#include <unordered_map>
 #include <unordered_set>
 
 namespace xquery {
@@ -43,15 +44,41 @@ bool sameNameAndText(const NSXMLNode* a, const NSXMLNode* b) {
   return a->nameView() == b->nameView() && a->textView() == b->textView();
 }
 
+// Finds an element's attributes by their names. An element may have tens of thousands, and going
+// through them for each name would take seconds; beyond a few a table finds them.
+class AttributesByName {
+ public:
+  AttributesByName(const NSXMLElement* element, uint32_t count) : _element(element) {
+    constexpr uint32_t few = 32;
+    if (count <= few) return;
+    for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
+         attribute = NSXMLElement::nextAttribute(attribute)) {
+      _table.emplace(attribute->nameView(), attribute);
+    }
+  }
+
+  const NSXMLNode* find(NSStringView name) const {
+    if (_table.empty()) return _element->attributeForName(name);
+    const auto found = _table.find(name);
+    return found == _table.end() ? nullptr : found->second;
+  }
+
+ private:
+  const NSXMLElement* _element;
+  std::unordered_map<NSStringView, const NSXMLNode*, TextHash> _table;
+};
+
 // The count test is what it is on purpose: an element without attributes differs from one with
 // exactly one attribute, and one with attributes differs from one without; all else passes, and
 // attributes that only b has are not looked at.
 bool sameAttributes(const NSXMLElement* a, const NSXMLElement* b) {
   const uint32_t refused = a->firstAttribute() ? 0 : 1;
-  if (b->attributeCount() == refused) return false;
+  const uint32_t count = b->attributeCount();
+  if (count == refused) return false;
+  const AttributesByName others(b, count);
   for (const NSXMLNode* attribute = a->firstAttribute(); attribute;
        attribute = NSXMLElement::nextAttribute(attribute)) {
-    const NSXMLNode* other = b->attributeForName(attribute->nameView());
+    const NSXMLNode* other = others.find(attribute->nameView());
     if (!other || !sameNameAndText(attribute, other)) return false;
   }
   return true;

@@ -260,7 +260,9 @@ Ref<XQueryNumber> XQueryNumber::number(const NSNumber& withNumber, XQueryTypeID 
 // A finite number that single precision does not hold becomes the shared infinity.
 Ref<XQueryNumber> XQueryNumber::singlePrecision(const NSNumber& number) {
   const double value = number.doubleValue();
-  if (!std::isfinite(value)) return make<XQueryNumber>(XQueryTypeFloat, number);
+  if (!std::isfinite(value) && number.storage() != Storage::Decimal) {
+    return make<XQueryNumber>(XQueryTypeFloat, number);
+  }
   const auto single = static_cast<float>(value);
   if (std::isinf(single)) return sharedInfinity(single < 0);
   return make<XQueryNumber>(XQueryTypeFloat, single);

@@ -1,6 +1,8 @@
 #include "Types/XQueryNodeFunctions.h"
 #include "TypesTestSupport.h"
 
+#include <chrono>
+
 namespace xquery {
 namespace {
 
@@ -226,6 +228,28 @@ TEST(NodeEqual, OfDocumentsAndElements) {
     EXPECT_EQ(XQueryNodeEqual(a.get(), b.get(), nullptr), row.equal) << row.a << " " << row.b;
     EXPECT_EQ(XQueryNodeEqual(root(a), root(b), nullptr), row.equal) << row.a << " " << row.b;
   }
+}
+
+std::string elementWithAttributes(int first, int last, int step, std::string_view lastValue) {
+  std::string xml = "<a";
+  for (int number = first; number != last; number += step) {
+    xml += " n" + std::to_string(number) + "='v'";
+  }
+  return xml + " last='" + std::string(lastValue) + "'/>";
+}
+
+TEST(NodeEqual, ManyAttributesAreFoundByName) {
+  constexpr int many = 30000;
+  const auto ascending = parse(elementWithAttributes(0, many, 1, "x"));
+  const auto descending = parse(elementWithAttributes(many - 1, -1, -1, "x"));
+  const auto different = parse(elementWithAttributes(0, many, 1, "y"));
+  const auto fewer = parse(elementWithAttributes(1, many, 1, "x"));
+  const auto start = std::chrono::steady_clock::now();
+  EXPECT_TRUE(XQueryNodeEqual(ascending.get(), descending.get(), nullptr));
+  EXPECT_FALSE(XQueryNodeEqual(ascending.get(), different.get(), nullptr));
+  EXPECT_FALSE(XQueryNodeEqual(ascending.get(), fewer.get(), nullptr));
+  EXPECT_TRUE(XQueryNodeEqual(fewer.get(), ascending.get(), nullptr));
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(1));
 }
 
 TEST(NodeEqual, ANodeIsEqualToItselfAndToNoOtherKind) {

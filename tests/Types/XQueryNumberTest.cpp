@@ -132,6 +132,9 @@ TEST(XQueryNumber, FloatsAreSinglePrecision) {
   EXPECT_EQ(made(XQueryTypeFloat, "0.1"), "0.1");
   EXPECT_EQ(XQueryNumber::floatWithNumber(*number(1e300)).get(), XQueryNumber::posInf());
   EXPECT_EQ(XQueryNumber::floatWithNumber(*number(-1e300)).get(), XQueryNumber::negInf());
+  EXPECT_EQ(XQueryNumber::floatWithNumber(*number("1e400")).get(), XQueryNumber::posInf());
+  EXPECT_EQ(XQueryNumber::floatWithNumber(*number("-1e400")).get(), XQueryNumber::negInf());
+  EXPECT_EQ(made(XQueryTypeFloat, "none"), "NaN");
 }
 
 TEST(XQueryNumber, DecimalsAreNotTruncated) {
