@@ -101,16 +101,19 @@ TEST(DataMatchAll, AlternativesKeepTheirOrderAfterOneIsExhausted) {
   EXPECT_EQ(all("a.b", anyOf({"x", ""}), anyOf({"y", "."})), "[a.]");
 }
 
-// Looking again and again for patterns that are not there would take minutes.
+// Looking again and again for patterns that are not there would take minutes. AddressSanitizer
+// itself reads all the bytes that are left before each search, so nothing can be told from the time.
 TEST(DataMatchAll, AbsentAlternativesAreLookedForOnce) {
   std::string bytes;
   while (bytes.size() < 500000) bytes += "<>";
-  const auto start = std::chrono::steady_clock::now();
+  [[maybe_unused]] const auto start = std::chrono::steady_clock::now();
   const Ref<NSData> searched = NSData::dataWithBytes(std::move(bytes));
   const Value slices =
       XQueryDataMatch(*searched, anyOf({"absent", "<"}).get(), anyOf({"missing", ">"}).get(), true);
   EXPECT_EQ(cast<NSArray>(slices)->count(), 250000U);
+#ifndef __SANITIZE_ADDRESS__
   EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5));
+#endif
 }
 
 TEST(DataMatchAll, StopsAtAnEmptyMatch) {
