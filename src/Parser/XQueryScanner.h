@@ -25,9 +25,10 @@ namespace xquery {
 #define XQUERY_SCANNER_STATES(STATE)                                                              \
   STATE(INITIAL)                                                                                  \
   STATE(DEFAULT)                                                                                  \
-  STATE(OPERATOR) STATE(NAMESPACEDECL) STATE(NAMESPACEKEYWORD) STATE(XMLSPACE_DECL)               \
-      STATE(ITEMTYPE) STATE(SINGLETYPE) STATE(KINDTEST) STATE(KINDTESTFORPI) STATE(VARNAME)       \
-          STATE(START_TAG) STATE(END_TAG) STATE(XML_COMMENT) STATE(PROCESSING_INSTRUCTION)        \
+  STATE(OPERATOR)                                                                                 \
+  STATE(NAMESPACEDECL) STATE(NAMESPACEKEYWORD) STATE(XMLSPACE_DECL) STATE(ITEMTYPE)               \
+      STATE(SINGLETYPE) STATE(KINDTEST) STATE(KINDTESTFORPI) STATE(VARNAME) STATE(START_TAG)      \
+          STATE(END_TAG) STATE(XML_COMMENT) STATE(PROCESSING_INSTRUCTION)                         \
               STATE(PROCESSING_INSTRUCTION_CONTENT) STATE(CDATA_SECTION) STATE(ELEMENT_CONTENT)   \
                   STATE(QUOT_ATTRIBUTE_CONTENT) STATE(APOS_ATTRIBUTE_CONTENT) STATE(EXPR_COMMENT) \
                       STATE(EXT_KEY) STATE(EXT_NAME) STATE(PRAG_NAME) STATE(EXT_CONTENT)          \

@@ -1,0 +1,361 @@
+// The driver: errors and their lines, setters, input, the lock, hostile queries.
+#include "Parser/XQueryParser.h"
+#include "Parser/XQueryScanner.h"
+#include "Parser/XQueryTokens.h"
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <cstdlib>
+#include <ctime>
+#include <functional>
+#include <thread>
+
+namespace xquery {
+namespace {
+
+Ref<XQueryParser> parsed(std::string_view query) {
+  return XQueryParser::parserWithSource(NSString::stringWithUTF8(query));
+}
+
+std::vector<std::string> errorsOf(std::string_view query) {
+  std::vector<std::string> result;
+  const auto parser = parsed(query);
+  for (const auto& error : parser->errors()) {
+    result.push_back(error->localizedDescription()->utf8());
+  }
+  return result;
+}
+
+using Strings = std::vector<std::string>;
+
+// --- results -----------------------------------------------------------------------------------
+
+TEST(Parser, AQueryOfNothingIsValidAndHasNoModule) {
+  for (const char* query : {"", " ", "\n\t\r", "(: nothing :)", "(:: pragma p:x y ::)"}) {
+    const auto parser = parsed(query);
+    EXPECT_TRUE(parser->errors().empty()) << query;
+    EXPECT_FALSE(parser->parsedModule()) << query;
+  }
+}
+
+TEST(Parser, AMainModuleHasItemsBodyAndVersion) {
+  const auto parser = parsed("xquery version '1.0'; declare namespace p = 'u'; 1");
+  const auto& module = parser->parsedModule();
+  ASSERT_TRUE(module);
+  EXPECT_EQ(module->prologItems().size(), 1u);
+  EXPECT_TRUE(module->body());
+  EXPECT_EQ(module->version()->utf8(), "1.0");
+  EXPECT_FALSE(parsed("1")->parsedModule()->version());
+  EXPECT_TRUE(parsed("1")->parsedModule()->prologItems().empty());
+}
+
+TEST(Parser, AnEncodingDeclarationIsDropped) {
+  const auto parser = parsed("xquery version '1.0' encoding 'anything'; 1");
+  EXPECT_EQ(parser->parsedModule()->version()->utf8(), "1.0");
+}
+
+TEST(Parser, ALibraryModuleHasNoBody) {
+  const auto parser = parsed("xquery version '1.0'; module namespace p = 'u';");
+  ASSERT_TRUE(parser->parsedModule());
+  EXPECT_FALSE(parser->parsedModule()->body());
+  EXPECT_EQ(parser->parsedModule()->version()->utf8(), "1.0");
+}
+
+TEST(Parser, KeepsItsSource) {
+  const Ref<NSString> source = NSString::stringWithASCII("1");
+  EXPECT_EQ(XQueryParser::parserWithSource(source)->source(), source);
+}
+
+TEST(Parser, AFailedParseHasNoModule) {
+  EXPECT_FALSE(parsed("1 +")->parsedModule());
+  EXPECT_FALSE(parsed("1 #")->parsedModule());
+}
+
+// --- errors ------------------------------------------------------------------------------------
+
+TEST(Parser, SyntaxErrorsNameTheTokenAndTheLine) {
+  EXPECT_EQ(errorsOf("1 = 2 = 3"),
+            Strings{"XQueryError:3 - \"parse error invalid token (=)- 1 = 2 = 3\" at line:1"});
+  EXPECT_EQ(errorsOf("1,\n\n  )"),
+            Strings{"XQueryError:3 - \"parse error invalid token ())-   )\" at line:3"});
+}
+
+TEST(Parser, AtTheEndTheTokenIsEmpty) {
+  EXPECT_EQ(errorsOf("1 +"),
+            Strings{"XQueryError:3 - \"parse error invalid token ()- 1 +\" at line:1"});
+  EXPECT_EQ(errorsOf("1 +\n"),
+            Strings{"XQueryError:3 - \"parse error invalid token ()- \" at line:2"});
+}
+
+TEST(Parser, AnErrorOfTheScannerComesFirst) {
+  EXPECT_EQ(errorsOf("1 #"),
+            (Strings{"XQueryError:3 - \"invalid token (#) - 1 #\" at line:1",
+                     "XQueryError:3 - \"parse error invalid token (#)- 1 #\" at line:1"}));
+  EXPECT_EQ(errorsOf("1\n(: a\n"),
+            (Strings{"XQueryError:3 - \"comment not terminated  - (: a\" at line:2",
+                     "XQueryError:3 - \"parse error invalid token ()- \" at line:3"}));
+}
+
+TEST(Parser, ExtensionsFailAndPragmasDoNot) {
+  EXPECT_EQ(errorsOf("(:: extension e:x data ::) 1"),
+            Strings{"XQueryError:14 - \"must-understand extension not supported (e:x data)\" "
+                    "at line:1"});
+  EXPECT_TRUE(errorsOf("(:: pragma e:x data ::) 1").empty());
+  EXPECT_TRUE(parsed("(:: pragma e:x data ::) 1")->parsedModule());
+}
+
+TEST(Parser, SourceLinesAreCountedFromZero) {
+  const auto parser = parsed("one\ntwo\r\n\nfour");
+  EXPECT_EQ(parser->sourceLine(0)->utf8(), "one");
+  EXPECT_EQ(parser->sourceLine(1)->utf8(), "two\r");
+  EXPECT_EQ(parser->sourceLine(2)->utf8(), "");
+  EXPECT_EQ(parser->sourceLine(3)->utf8(), "four");
+  EXPECT_EQ(parser->sourceLine(4)->utf8(), "");
+  EXPECT_EQ(parser->sourceLine(-1)->utf8(), "");
+  EXPECT_EQ(parser->errors().front()->line(), 2);
+  EXPECT_EQ(parsed("#")->errors().front()->line(), 1);
+}
+
+TEST(Parser, ErrorsAreLoggedWhenTheEnvironmentSaysSo) {
+  ::setenv("XQUERY_LOG", "1", 1);
+  testing::internal::CaptureStderr();
+  const auto parser = parsed("(:: extension e:x data ::) 1 #");
+  const std::string log = testing::internal::GetCapturedStderr();
+  ::unsetenv("XQUERY_LOG");
+  EXPECT_NE(log.find("\nmust-understand extension not supported (e:x data)\n"), std::string::npos);
+  EXPECT_NE(log.find("\ninvalid token (#) - (:: extension e:x data ::) 1 #\n"), std::string::npos);
+  EXPECT_NE(log.find("\nparse error invalid token (#)- (:: "), std::string::npos);
+  testing::internal::CaptureStderr();
+  EXPECT_FALSE(parsed("1 #")->parsedModule());
+  EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+}
+
+TEST(Parser, AFatalFailureIsRecordedWithoutALineAndRaised) {
+  const auto parser = XQueryParser::unparsedParserWithSource(NSString::empty());
+  const XQueryParser::Session session(*parser);
+  try {
+    XQueryFatalError("out of dynamic memory in yy_create_buffer()");
+    FAIL();
+  } catch (const NSException& exception) {
+    EXPECT_EQ(exception.name(), "XQueryLexFatalErr");
+    EXPECT_EQ(exception.reason()->utf8(), "out of dynamic memory in yy_create_buffer()");
+  }
+  ASSERT_EQ(parser->errors().size(), 1u);
+  EXPECT_EQ(parser->errors()[0]->localizedDescription()->utf8(),
+            "XQueryError:3 - \"out of dynamic memory in yy_create_buffer()\"");
+}
+
+// --- setters -----------------------------------------------------------------------------------
+
+struct Setter {
+  const char* declaration;
+  int64_t number;
+  const char* message;
+};
+
+const Setter setters[] = {
+    {"declare xmlspace strip;", 68, "Prolog contains more than one xmlspace declaration"},
+    {"declare default collation 'u';", 38,
+     "Prolog contains more than one default collation declaration"},
+    {"declare base-uri 'u';", 32, "Prolog contains more than one base URI declaration"},
+    {"declare construction strip;", 67, "Prolog contains more than one construction declaration"},
+    {"declare ordering ordered;", 65, "Prolog contains more than one ordering mode declaration"},
+    {"declare default order empty least;", 69,
+     "Prolog contains more than one empty ordering declaration"},
+    {"declare inherit-namespaces yes;", 55,
+     "Prolog contains more than one inherit-namespaces declaration"},
+};
+
+TEST(Parser, ASecondSetterOfAKindIsAnErrorAtItsLine) {
+  for (const Setter& setter : setters) {
+    std::string query = setter.declaration;
+    query += "\n\n";
+    query += setter.declaration;
+    query += "\n1";
+    const auto parser = parsed(query);
+    ASSERT_EQ(parser->errors().size(), 1u) << query;
+    EXPECT_EQ(parser->errors()[0]->err(), setter.number);
+    EXPECT_EQ(parser->errors()[0]->msg()->utf8(), setter.message);
+    EXPECT_EQ(parser->errors()[0]->line(), 3) << query;
+  }
+}
+
+TEST(Parser, TheLineOfASecondSetterIsThatOfItsFirstWord) {
+  const auto parser = parsed("declare xmlspace strip; declare\nxmlspace\nstrip\n;\n1");
+  ASSERT_EQ(parser->errors().size(), 1u);
+  EXPECT_EQ(parser->errors()[0]->line(), 1);
+}
+
+TEST(Parser, EverySetterMayStandOnceInAnyOrder) {
+  std::string query;
+  for (const Setter& setter : setters) query = setter.declaration + query;
+  EXPECT_TRUE(errorsOf(query + "1").empty());
+  EXPECT_TRUE(errorsOf(query + "1").empty()) << "the next parse starts afresh";
+}
+
+TEST(Parser, AThirdSetterIsASecondError) {
+  EXPECT_EQ(
+      errorsOf("declare xmlspace strip; declare xmlspace strip; declare xmlspace strip; 1").size(),
+      2u);
+}
+
+TEST(Parser, AnUnknownSetterFlagIsIgnored) {
+  const auto parser = XQueryParser::unparsedParserWithSource(NSString::empty());
+  const XQueryParser::Session session(*parser);
+  for (const unsigned flag : {0U, 3U, 128U}) {
+    XQueryParserSetSetterFlag(flag, 0);
+    XQueryParserSetSetterFlag(flag, 0);
+  }
+  EXPECT_TRUE(parser->errors().empty());
+}
+
+// --- what cannot be compiled ---------------------------------------------------------------------
+
+TEST(Parser, OneConstructThatCannotBeCompiledIsReported) {
+  EXPECT_EQ(errorsOf("1,\n2,\n<a b='{1}'>{2}</a>,\n<c/>"),
+            Strings{"XQueryError:0 - \"element constructors are not available in this build\" "
+                    "at line:3"});
+}
+
+TEST(Parser, TheConstructOnTheLowestLineIsReported) {
+  EXPECT_EQ(errorsOf("<a>{\n<?b?>\n}</a>"),
+            Strings{"XQueryError:0 - \"element constructors are not available in this build\" "
+                    "at line:1"});
+}
+
+TEST(Parser, SyntaxErrorsComeBeforeWhatCannotBeCompiled) {
+  EXPECT_EQ(errorsOf("<a/>, 1 = 2 = 3"),
+            Strings{"XQueryError:3 - \"parse error invalid token (=)- <a/>, 1 = 2 = 3\" "
+                    "at line:1"});
+}
+
+// --- input -------------------------------------------------------------------------------------
+
+TEST(Parser, HandsOutItsSourceInPieces) {
+  const auto parser =
+      XQueryParser::unparsedParserWithSource(NSString::stringWithUTF8("ab\xC3\xA9"));
+  char buffer[8] = {};
+  EXPECT_EQ(parser->readChars(3, buffer), 3u);
+  EXPECT_EQ(std::string(buffer, 3), "ab\xC3");
+  EXPECT_EQ(parser->readChars(8, buffer), 1u);
+  EXPECT_EQ(buffer[0], '\xA9');
+  EXPECT_EQ(parser->readChars(8, buffer), 0u);
+}
+
+TEST(Parser, ALoneSurrogateIsReadAsTheReplacementCharacter) {
+  const auto parser = XQueryParser::parserWithSource(NSString::stringWithUTF16(u"'\xD800'"));
+  EXPECT_TRUE(parser->errors().empty());
+}
+
+TEST(Parser, ANulByteIsAnInvalidToken) {
+  const auto parser = parsed(std::string_view("1 \0 2", 5));
+  ASSERT_FALSE(parser->errors().empty());
+  EXPECT_EQ(parser->errors()[0]->msg()->utf8(), std::string("invalid token (\0) - 1 \0 2", 25));
+}
+
+// --- the lock ----------------------------------------------------------------------------------
+
+TEST(Parser, ThereIsNoCurrentParserOutsideAParse) {
+  EXPECT_EQ(XQueryParser::currentParser(), nullptr);
+  const auto parser = parsed("1");
+  EXPECT_EQ(XQueryParser::currentParser(), nullptr);
+  {
+    const auto other = XQueryParser::unparsedParserWithSource(NSString::empty());
+    const XQueryParser::Session session(*other);
+    EXPECT_EQ(XQueryParser::currentParser(), other.get());
+  }
+  EXPECT_EQ(XQueryParser::currentParser(), nullptr);
+}
+
+TEST(Parser, SeveralThreadsMayParse) {
+  std::atomic<int> failures = 0;
+  std::vector<std::thread> threads;
+  for (int index = 0; index < 4; ++index) {
+    threads.emplace_back([index, &failures] {
+      const std::string line(static_cast<size_t>(index), '\n');
+      for (int round = 0; round < 200; ++round) {
+        if (!parsed(line + "a/b[c = 'd'] + 1")->errors().empty()) ++failures;
+        const auto wrong = parsed(line + "1 = 2 = 3");
+        if (wrong->errors().size() != 1 || wrong->errors()[0]->line() != index + 1) ++failures;
+      }
+    });
+  }
+  for (std::thread& thread : threads) thread.join();
+  EXPECT_EQ(failures, 0);
+}
+
+// --- long and deep queries -----------------------------------------------------------------------
+
+std::string repeated(std::string_view text, size_t count) {
+  std::string result;
+  result.reserve(text.size() * count);
+  for (size_t index = 0; index < count; ++index) result += text;
+  return result;
+}
+
+TEST(Parser, NestingBeyondTheStackIsAClearError) {
+  const auto parser = parsed(repeated("(", 100000) + "1" + repeated(")", 100000));
+  ASSERT_EQ(parser->errors().size(), 1u);
+  EXPECT_EQ(parser->errors()[0]->msg()->utf8().find("parser stack overflow invalid token (()- (("),
+            0u);
+  EXPECT_FALSE(parser->parsedModule());
+  EXPECT_TRUE(parsed("1")->parsedModule()) << "the next parse is not harmed";
+}
+
+TEST(Parser, NestingWithinTheStackIsParsed) {
+  EXPECT_TRUE(parsed(repeated("(", 9900) + "1" + repeated(")", 9900))->parsedModule());
+  EXPECT_FALSE(parsed(repeated("(", 10000) + "1" + repeated(")", 10000))->parsedModule());
+  EXPECT_TRUE(parsed(repeated("<a>", 2400) + repeated("</a>", 2400))->parsedModule());
+  EXPECT_FALSE(parsed(repeated("<a>", 3400) + repeated("</a>", 3400))->parsedModule());
+}
+
+// Of this thread, so that a busy machine does not disturb the measure.
+double processorSeconds() {
+  timespec now = {};
+  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &now);
+  return static_cast<double>(now.tv_sec) + 1e-9 * static_cast<double>(now.tv_nsec);
+}
+
+double parseSeconds(const std::string& query) {
+  const double start = processorSeconds();
+  const auto parser = parsed(query);
+  const double elapsed = processorSeconds() - start;
+  // What cannot be compiled is parsed all the same.
+  EXPECT_TRUE(parser->errors().empty() || parser->errors()[0]->err() == 0)
+      << parser->errors()[0]->msg()->utf8().substr(0, 80);
+  return elapsed;
+}
+
+void expectLinear(const std::function<std::string(size_t)>& query, size_t size) {
+  parseSeconds(query(size / 8));
+  const double small = parseSeconds(query(size / 8));
+  const double large = parseSeconds(query(size));
+  // Eight times the work; a quadratic parser would take 64 times as long.
+  EXPECT_LT(large, 24 * small + 0.05);
+}
+
+TEST(Parser, LongQueriesTakeLinearTime) {
+  expectLinear([](size_t count) { return "1" + repeated("+1", count); }, 100000);
+  expectLinear([](size_t count) { return "a" + repeated("/a", count); }, 100000);
+  expectLinear([](size_t count) { return "1" + repeated(",1", count); }, 100000);
+  expectLinear([](size_t count) { return "a" + repeated("[1]", count); }, 100000);
+  expectLinear([](size_t count) { return repeated("- ", count) + "1"; }, 800000);
+  expectLinear([](size_t count) { return "\"" + std::string(count, 'x') + "\""; }, 8000000);
+  expectLinear([](size_t count) { return "\"" + repeated("\"\"", count) + "\""; }, 1000000);
+  expectLinear([](size_t count) { return std::string(count, 'x'); }, 8000000);
+  expectLinear([](size_t count) { return std::string(count, ' ') + "1"; }, 8000000);
+  expectLinear([](size_t count) { return "1(:" + std::string(count, '-') + ":)"; }, 8000000);
+  expectLinear([](size_t count) { return repeated("(: ", count) + repeated(":)", count) + "1"; },
+               800000);
+  expectLinear([](size_t count) { return "1" + repeated("(: a :) + (: b :) a", count); }, 80000);
+  expectLinear([](size_t count) { return "<a>" + std::string(count, 'x') + "</a>"; }, 800000);
+  expectLinear([](size_t count) { return "declare (:" + std::string(count, 'x') + ":)"; }, 8000000);
+}
+
+TEST(Parser, ALongNameOfOtherLettersTakesLinearTime) {
+  expectLinear([](size_t count) { return repeated("\xC3\xA9", count); }, 800000);
+}
+
+}  // namespace
+}  // namespace xquery
