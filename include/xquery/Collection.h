@@ -18,6 +18,9 @@ class XQUERY_EXPORT NSNull : public NSCounted {
 };
 
 // An ordered list of objects; owns a reference to each element.
+//
+//   auto names = NSArray::arrayWithObjects({NSString::stringWithASCII("a")});
+//   for (const Value& name : names->objects()) use(*cast<NSString>(name));
 class XQUERY_EXPORT NSArray : public NSCounted {
  public:
   static bool classof(const NSObject& object) {

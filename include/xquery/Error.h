@@ -11,6 +11,7 @@
 
 namespace xquery {
 
+// What every error object answers. Errors are immutable.
 class XQUERY_EXPORT NSError : public NSCounted {
  public:
   static bool classof(const NSObject& object) {
@@ -27,6 +28,7 @@ class XQUERY_EXPORT NSError : public NSCounted {
   int64_t code() const { return _code; }
   // Null when the error has neither message nor line.
   const UserInfo* userInfo() const { return _userInfo ? &*_userInfo : nullptr; }
+  // A new string for a reader.
   virtual Ref<NSString> localizedDescription() const;
   virtual Ref<NSString> description() const { return localizedDescription(); }
 
@@ -40,7 +42,11 @@ class XQUERY_EXPORT NSError : public NSCounted {
 };
 
 // An error of the engine: domain "XQueryErrorDomain", the code is the error number. Lines count
-// from 1; 0 means that no line is known.
+// from 1; 0 means that no line is known. With the environment variable XQUERY_LOG set (not empty
+// and not "0"), making one logs its description.
+//
+//   if (error->err() == 8) undefined(error->msg()->utf8(), error->line());
+//   log(error->description()->utf8());   // XQueryError:8 - "reference to ..." at line:3
 class XQUERY_EXPORT XQueryError : public NSError {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::QueryError; }
@@ -55,11 +61,14 @@ class XQUERY_EXPORT XQueryError : public NSError {
                                               int64_t atLine);
   [[nodiscard]] static Ref<XQueryError> error(int64_t number, std::string_view withMsg);
 
+  // The same as the code.
   int64_t err() const { return _err; }
+  // May be null.
   const Ref<NSString>& msg() const { return _msg; }
   int64_t line() const { return _line; }
 
-  // XQueryError:3 - "message" at line:5
+  // XQueryError:3 - "message" at line:5, or without the last part when no line is known. A missing
+  // message prints as (null).
   Ref<NSString> localizedDescription() const override;
 
  protected:
@@ -73,7 +82,8 @@ class XQUERY_EXPORT XQueryError : public NSError {
   int64_t _line;
 };
 
-// The one exception type of the engine.
+// The one exception type of the engine, thrown and caught inside it; a run-time error has the name
+// "XQueryError" and the error's description as its reason.
 class XQUERY_EXPORT NSException {
  public:
   NSException(std::string name, Ref<NSString> reason)

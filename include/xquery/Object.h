@@ -194,7 +194,11 @@ const T* dyn_cast(const NSObject* object) {
   return isa<T>(object) ? static_cast<const T*>(object) : nullptr;
 }
 
-// A counted reference to an object of class T; may be null.
+// A counted reference to an object of class T; may be null. Whoever holds a Ref owns a share of the
+// object; a plain pointer is borrowed from whoever does.
+//
+//   Value item = items->objects().front();
+//   if (auto* element = dyn_cast<NSXMLElement>(item)) use(*element);
 template <class T>
 class Ref {
  public:

@@ -1,25 +1,21 @@
 // Compile a query once, evaluate it as often as you like.
 //
-//   auto query = XQuery::xqueryWithSource("//book[price > 10]/title");
-//   if (auto errors = query->parseErrors()) ...              // an NSArray of XQueryError
-//   auto context = XQueryContext::xqueryContext();
-//   Ref<XQueryError> error;
-//   auto items = context->evaluateXQuery(*query, {}, document, &error);
-//   if (!items) ...                                           // error->description()
-//
 // A query is immutable and may be evaluated by several threads at once, each with a context of its
 // own. A context is for one thread at a time. Compilations are serialised by one lock.
+//
+// Failures are handed back as XQueryError objects; the engine throws nothing at its caller. What a
+// host's own client throws passes through.
 #pragma once
-
-#include <map>
-#include <memory>
-#include <string>
-#include <string_view>
 
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
+
+#include <map>
+#include <memory>
+#include <string>
+#include <string_view>
 
 namespace xquery {
 
@@ -27,11 +23,18 @@ class XQueryInternal;
 class XQueryContextInternal;
 class XQueryContext;
 
-// Lexical variable name (prefix:local, without the dollar sign) to value: an item or an NSArray of
-// items. The prefix is resolved in the query's prolog; no prefix means no namespace.
+// Lexical variable name (UTF-8, prefix:local, without the dollar sign) to value: an item, an
+// NSArray of items, or the NSNull. The prefix is resolved in the query's prolog; no prefix means no
+// namespace. A name that does not resolve and a null value are passed over. Values are used as
+// given: a plain NSString, for example, is an xdt:untypedAtomic value.
 using XQueryConstants = std::map<std::string, Value>;
 
 // A compiled query. Errors found while compiling are kept in it.
+//
+//   auto query = XQuery::xqueryWithSource("//book[price > 10]/title");
+//   if (auto errors = query->parseErrors()) {
+//     for (const Value& error : errors->objects()) report(cast<XQueryError>(error)->description());
+//   }
 class XQUERY_EXPORT XQuery : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Query; }
@@ -41,9 +44,12 @@ class XQUERY_EXPORT XQuery : public NSCounted {
   // UTF-8 text; text that is not well-formed UTF-8 is a compile error (3, no line).
   [[nodiscard]] static Ref<XQuery> xqueryWithSource(std::string_view source);
 
-  // A new array of XQueryError in the order found, or null when the query compiled.
+  // Null when the query compiled, else a new array of one XQueryError or more in the order found:
+  // those of the parser, or, when it found none, those of the prolog and of names that do not
+  // resolve.
   Ref<NSArray> parseErrors() const;
 
+  // For the engine itself.
   XQueryInternal& _internal() const { return *_private; }
 
  protected:
@@ -56,23 +62,42 @@ class XQUERY_EXPORT XQuery : public NSCounted {
   std::unique_ptr<XQueryInternal> _private;
 };
 
-// What a host may implement to hear fn:trace.
+// What a host may implement to hear fn:trace. Without a client a trace is written to the log, one
+// line of label and value, when the environment variable XQUERY_LOG is set, not empty and not "0".
+//
+//   class Tracer : public XQueryClient {
+//     void XQueryClientTraceValue(const Value& value, const Ref<NSString>& label,
+//                                 XQueryContext&) override {
+//       trace(label->utf8(), value);
+//     }
+//   };
+//   context->contextSetClient(std::make_shared<Tracer>());
 class XQUERY_EXPORT XQueryClient {
  public:
   virtual ~XQueryClient() = default;
-  // `value` is what was traced, in any of the value shapes but null; `label` is a string.
+  // `value` is what was traced, in any of the value shapes but null: the NSNull for the empty
+  // sequence, an item, or an NSArray. Both live during the call; keep a Ref to hold them longer.
+  // Called on the evaluating thread; evaluating against the same context from here is not allowed.
   virtual void XQueryClientTraceValue(const Value& value, const Ref<NSString>& label,
                                       XQueryContext& context) = 0;
 };
 
 // The object against which queries are evaluated. It keeps, from one evaluation to the next, its
-// client, its namespaces, the current date-time, its last error and its focus.
+// client, its namespaces, its last error and its focus.
+//
+//   auto context = XQueryContext::xqueryContext();
+//   Ref<XQueryError> error;
+//   auto items = context->evaluateXQuery(*query, {{"limit", XQueryUntypedAtomic("10")}}, document,
+//                                        &error);
+//   if (!items) report(error ? error->description()->utf8() : "no value");
 class XQUERY_EXPORT XQueryContext : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Context; }
 
   [[nodiscard]] static Ref<XQueryContext> xqueryContext();
-  // Prefix to URI; consulted for names that could not be resolved when the query was compiled.
+  // Prefix to URI, both UTF-8 (a pair that is not is passed over); consulted for names that could
+  // not be resolved when the query was compiled. The empty prefix gives names without one their
+  // namespace.
   [[nodiscard]] static Ref<XQueryContext> xqueryContextWithNamespaces(
       const std::map<std::string, std::string>& namespaces);
 
@@ -80,17 +105,28 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   void addXQueryProlog(const Value& prolog);
 
   // Evaluates and answers an array of items: nodes of the input tree, new nodes, atomic values. The
-  // empty sequence is an empty array. Null on error, with `*error` set when `error` is not null.
+  // empty sequence is an empty array. The array and its items are the caller's to keep; a node
+  // keeps its whole tree alive. When constructors recorded a base URI and the first item is an
+  // element or a document, that element is given an xml:base attribute unless it has one.
+  //
+  // Null on error and when there is no value at all (an empty query, a library module, "." without
+  // a context item). `*error`, when `error` is not null, is set to null first and on failure to the
+  // error: the first one of a query that failed to compile, 16 "unresloved external variable -
+  // name" or "unresloved external function - name", 0 and a text that begins with "limit: " when
+  // the engine ran out of stack, memory or digits, or what an expression raised.
+  //
   // A null or NSNull context item leaves the context item of an earlier evaluation in force.
   [[nodiscard]] Ref<NSArray> evaluateXQuery(const XQuery& query, const XQueryConstants& constants,
                                             const Value& contextItem,
                                             Ref<XQueryError>* error = nullptr);
 
+  // The context shares the client with the host; null takes it away.
   void contextSetClient(std::shared_ptr<XQueryClient> client);
   std::shared_ptr<XQueryClient> contextClient() const;
   // Accepts its arguments and does nothing.
   void contextAddClientSelector(std::string_view selector, std::string_view forName);
 
+  // For the engine itself.
   void _traceValue(const Value& value, const Ref<NSString>& forLabel);
   XQueryContextInternal& _internal() const { return *_private; }
 
