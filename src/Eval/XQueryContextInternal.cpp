@@ -25,7 +25,7 @@ void XQueryContextInternal::setVariable(const Value& value, int64_t forID) {
 }
 
 NSObject* XQueryContextInternal::globalForQName(const XQueryQName& qName) const {
-  const auto found = _globals.find(Ref<XQueryQName>(const_cast<XQueryQName*>(&qName)));
+  const auto found = _globals.find(qName);
   return found == _globals.end() ? nullptr : found->second.get();
 }
 

@@ -80,7 +80,8 @@ class XQueryContextInternal {
   // --- errors ----------------------------------------------------------------------------------
   const Ref<XQueryError>& error() const { return _error; }
   // Keeps the error (the last one wins) and, when asked, throws an NSException named "XQueryError"
-  // whose reason is the error's description.
+  // whose reason is the error's description. With diagnostics on it is an assertion failure, logged
+  // and thrown under a name of its own.
   void setError(Ref<XQueryError> error, bool raiseException);
   // For code that always raises.
   [[noreturn]] void raise(Ref<XQueryError> error);

@@ -35,8 +35,12 @@ XQueryInternal::XQueryInternal(Ref<XQueryProlog> prolog, Ref<XQueryExpr> body)
 
 XQueryInternal::~XQueryInternal() = default;
 
-XQueryProlog* XQueryInternal::prolog() const { return _prolog.get(); }
+XQueryProlog* XQueryInternal::prolog() const {
+  return _prolog.get();
+}
 
-XQueryExpr* XQueryInternal::body() const { return _body.get(); }
+XQueryExpr* XQueryInternal::body() const {
+  return _body.get();
+}
 
 }  // namespace xquery

@@ -1,4 +1,4 @@
-// Storage with a fast path for one element, shared by the list containers.
+// Storage with a fast path for one element.
 //
 // `value` holds the only element while the container has exactly one and was never grown; `array`
 // holds the elements otherwise. At most one of the two is in use.
@@ -22,7 +22,6 @@ class SingleOrArray {
   }
   bool hasValue() const { return static_cast<bool>(_value); }
   bool hasArray() const { return _hasArray; }
-  std::vector<Ref<T>>& array() { return _array; }
 
   void append(Ref<T> element) {
     if (_value) moveValueToArray();
@@ -32,7 +31,6 @@ class SingleOrArray {
       _value = std::move(element);
     }
   }
-  void setValue(Ref<T> element) { _value = std::move(element); }
   void moveValueToArray() {
     _hasArray = true;
     _array.push_back(std::exchange(_value, Ref<T>()));

@@ -60,14 +60,19 @@ class XQueryQName : public NSCounted {
   mutable bool _isInterned = false;
 };
 
-// For tables keyed by QName.
+// For tables keyed by QName, which can be asked with a borrowed name.
 struct XQueryQNameHash {
+  using is_transparent = void;
+  size_t operator()(const XQueryQName& name) const { return name.hash(); }
   size_t operator()(const Ref<XQueryQName>& name) const { return name->hash(); }
 };
 struct XQueryQNameEqual {
+  using is_transparent = void;
   bool operator()(const Ref<XQueryQName>& a, const Ref<XQueryQName>& b) const {
     return a->isEqual(*b);
   }
+  bool operator()(const XQueryQName& a, const Ref<XQueryQName>& b) const { return a.isEqual(*b); }
+  bool operator()(const Ref<XQueryQName>& a, const XQueryQName& b) const { return a->isEqual(b); }
 };
 
 }  // namespace xquery
