@@ -17,7 +17,11 @@
 namespace xquery {
 
 Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source) {
-  return make<XQuery>(std::make_unique<XQueryInternal>(source));
+  try {
+    return make<XQuery>(std::make_unique<XQueryInternal>(source));
+  } catch (const std::bad_alloc&) {
+    return make<XQuery>(std::make_unique<XQueryInternal>(XQueryErrors::outOfMemory.error()));
+  }
 }
 
 Ref<XQuery> XQuery::xqueryWithSource(std::string_view source) {
@@ -117,7 +121,8 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   } catch (const std::bad_alloc&) {
     result = XQueryErrors::outOfMemory.error();
   } catch (const std::length_error&) {
-    result = XQueryErrors::outOfMemory.error();
+    // Only decimals throw it.
+    result = XQueryErrors::tooManyDigits.error();
   }
   context._clearGlobals();
   return shapedResult(result, error);

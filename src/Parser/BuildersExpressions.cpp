@@ -2,6 +2,7 @@
 #include "Expr/XQueryOperatorExpr.h"
 #include "Parser/BuilderSupport.h"
 #include "Parser/XQueryTokens.h"
+#include "Types/XQueryErrors.h"
 
 #include <algorithm>
 
@@ -56,8 +57,7 @@ constexpr const char* typeswitch = "typeswitch expressions";
 // A literal of more digits than a decimal holds is an error of the query, never another number.
 NSObject* XQDigits(Ref<XQueryLiteral> literal, int64_t line) {
   if (literal) return XQAtLine(std::move(literal), line);
-  XQueryParser::currentParser()->setError(
-      XQueryError::error(0, "limit: number of too many digits", line));
+  XQueryParser::currentParser()->setError(XQueryErrors::tooManyDigits.errorAtLine(line));
   return XQEmptyLiteral(line);
 }
 

@@ -9,6 +9,7 @@
 #include <climits>
 #include <cstring>
 #include <exception>
+#include <new>
 
 namespace xquery {
 namespace {
@@ -83,6 +84,9 @@ void XQueryParser::parse() {
   } catch (const NSException&) {
     // The error was recorded before it was raised.
     _parsedModule = nullptr;
+  } catch (const std::bad_alloc&) {
+    _parsedModule = nullptr;
+    setError(XQueryErrors::outOfMemory.error());
   } catch (const std::exception& failure) {
     _parsedModule = nullptr;
     setError(XQueryErrors::parserFailure.error(std::string_view(failure.what())));

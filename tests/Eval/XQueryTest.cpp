@@ -336,6 +336,14 @@ TEST_F(Driver, RunningOutOfMemoryIsALimit) {
   EXPECT_EQ(error->msg()->utf8(), "limit: out of memory");
 }
 
+TEST_F(Driver, ADecimalOfTooManyDigitsIsALimit) {
+  const std::string digits(200000, '9');
+  EXPECT_FALSE(evaluate("declare variable $x := " + digits + "; $x * $x"));
+  ASSERT_TRUE(error);
+  EXPECT_EQ(error->err(), 0);
+  EXPECT_EQ(error->msg()->utf8(), "limit: number of too many digits");
+}
+
 TEST_F(Driver, ParseErrorsAreAFreshArrayEachTime) {
   const auto bad = XQuery::xqueryWithSource("1 +");
   const auto first = bad->parseErrors();

@@ -22,6 +22,7 @@ constexpr Row row(const XQueryErrorText<places>& entry, int64_t number, std::str
 const Row rows[] = {
     row(XQueryErrors::nestedTooDeeply, 0, "limit: expression nested too deeply"),
     row(XQueryErrors::outOfMemory, 0, "limit: out of memory"),
+    row(XQueryErrors::tooManyDigits, 0, "limit: number of too many digits"),
     row(XQueryErrors::rangeTooLong, 0, "limit: range of too many items"),
     row(XQueryErrors::unavailableConstruct, 0, "%@ are not available in this build"),
     row(XQueryErrors::unresolvedQName, 1, "can't resolve QName for \"%@\""),
