@@ -101,8 +101,8 @@ TEST(DataMatchAll, AlternativesKeepTheirOrderAfterOneIsExhausted) {
   EXPECT_EQ(all("a.b", anyOf({"x", ""}), anyOf({"y", "."})), "[a.]");
 }
 
-// Looking again and again for patterns that are not there would take minutes. AddressSanitizer
-// itself reads all the bytes that are left before each search, so nothing can be told from the time.
+// Looking again and again for patterns that are not there would take minutes. No time is told under
+// AddressSanitizer, which itself reads all the bytes that are left before each search.
 TEST(DataMatchAll, AbsentAlternativesAreLookedForOnce) {
   std::string bytes;
   while (bytes.size() < 500000) bytes += "<>";
