@@ -1,10 +1,10 @@
 // Immutable bytes.
 #pragma once
 
+#include "xquery/Object.h"
+
 #include <string>
 #include <string_view>
-
-#include "xquery/Object.h"
 
 namespace xquery {
 

@@ -1,10 +1,10 @@
 // Document order between nodes.
 #pragma once
 
-#include <vector>
-
 #include "xquery/Object.h"
 #include "xquery/XMLNode.h"
+
+#include <vector>
 
 namespace xquery {
 
