@@ -33,9 +33,22 @@ constexpr SetterError setterErrors[] = {
     {XQuerySetterInheritNamespaces, XQueryErrors::secondInheritNamespaces},
 };
 
-void record(Ref<XQueryError> error) {
-  if (XQueryLogEnabled()) NSLog(error->msg()->utf8());
-  sXQueryParserCurrent->setError(std::move(error));
+void logText(const Ref<NSString>& text) {
+  if (XQueryLogEnabled()) NSLog(text->utf8());
+}
+
+// The error was logged when it was made; its text follows.
+void record(const Ref<XQueryError>& error) {
+  sXQueryParserCurrent->setError(error);
+  logText(error->msg());
+}
+
+// At the current line; the text comes first in the log, then the error.
+template <size_t places, class... Parts>
+void logAndRecord(const XQueryErrorText<places>& row, const Parts&... parts) {
+  const Ref<NSString> text = row.message(parts...);
+  logText(text);
+  sXQueryParserCurrent->setError(XQueryError::error(row.number, text, XQlineno));
 }
 
 Ref<NSString> currentSourceLine() {
@@ -155,12 +168,11 @@ void* XQueryParserAllocate(size_t size) {
 }
 
 void XQerror(const char* message) {
-  record(XQueryErrors::invalidToken.errorAtLine(XQlineno, message, XQScannerTokenText(),
-                                                currentSourceLine()));
+  logAndRecord(XQueryErrors::invalidToken, message, XQScannerTokenText(), currentSourceLine());
 }
 
 void XQueryParseError(std::string_view message) {
-  record(XQueryErrors::scannerError.errorAtLine(XQlineno, message, currentSourceLine()));
+  logAndRecord(XQueryErrors::scannerError, message, currentSourceLine());
 }
 
 void XQueryFatalError(const char* message) {

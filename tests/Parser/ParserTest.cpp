@@ -131,6 +131,25 @@ TEST(Parser, ErrorsAreLoggedWhenTheEnvironmentSaysSo) {
   EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
 }
 
+TEST(Parser, TheTextIsLoggedBeforeTheErrorAndAnExtensionsAfterIt) {
+  ::setenv("XQUERY_LOG", "1", 1);
+  testing::internal::CaptureStderr();
+  parsed("1 #");
+  const std::string token = testing::internal::GetCapturedStderr();
+  testing::internal::CaptureStderr();
+  parsed("(:: extension e:x data ::) 1");
+  const std::string extension = testing::internal::GetCapturedStderr();
+  ::unsetenv("XQUERY_LOG");
+  EXPECT_EQ(token,
+            "invalid token (#) - 1 #\n"
+            "XQueryError:3 - \"invalid token (#) - 1 #\" at line:1\n"
+            "parse error invalid token (#)- 1 #\n"
+            "XQueryError:3 - \"parse error invalid token (#)- 1 #\" at line:1\n");
+  EXPECT_EQ(extension,
+            "XQueryError:14 - \"must-understand extension not supported (e:x data)\" at line:1\n"
+            "must-understand extension not supported (e:x data)\n");
+}
+
 TEST(Parser, AFatalFailureIsRecordedWithoutALineAndRaised) {
   const auto parser = XQueryParser::unparsedParserWithSource(NSString::empty());
   const XQueryParser::Session session(*parser);
