@@ -89,6 +89,7 @@ enum class Kind : uint8_t {
   OperatorExpr,
   TypeDeclaration,
   Param,
+  NamespaceExpr,
   OtherExpr,
   ExprLast = 255,
 };

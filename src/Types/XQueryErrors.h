@@ -137,5 +137,15 @@ inline constexpr XQueryErrorText<> itemNotAtomic{19, "item not an atomic typ"};
 inline constexpr XQueryErrorText<> itemNotANodeOrAtomic{19, "item not a node or atomic type"};
 inline constexpr XQueryErrorText<> contextItemNotANode{20, "context item not a node"};
 
+// --- constructors --------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<> attributeNotDistinct{25, "Attribute name not distinct"};
+inline constexpr XQueryErrorText<> invalidInstruction{
+    26, "processing instruction content cannot contain ?>"};
+inline constexpr XQueryErrorText<> invalidDocumentNode{28, "invalid node for document"};
+inline constexpr XQueryErrorText<> attributeIsXMLNS{44, "Attribute namesapce is xmlns"};
+inline constexpr XQueryErrorText<> invalidNamespace{70, "invalid namespace declaration"};
+inline constexpr XQueryErrorText<> invalidComment{72, "invalid comment"};
+
 }  // namespace XQueryErrors
 }  // namespace xquery
