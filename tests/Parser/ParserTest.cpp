@@ -9,6 +9,7 @@
 #include <cstdlib>
 #include <ctime>
 #include <functional>
+#include <random>
 #include <thread>
 
 namespace xquery {
@@ -28,6 +29,10 @@ std::vector<std::string> errorsOf(std::string_view query) {
 }
 
 using Strings = std::vector<std::string>;
+
+bool isBlank(std::string_view text) {
+  return text.find_first_not_of(" \t\r\n") == text.npos;
+}
 
 // --- results -----------------------------------------------------------------------------------
 
@@ -370,6 +375,43 @@ TEST(Parser, LongQueriesTakeLinearTime) {
   expectLinear([](size_t count) { return "1" + repeated("(: a :) + (: b :) a", count); }, 80000);
   expectLinear([](size_t count) { return "<a>" + std::string(count, 'x') + "</a>"; }, 800000);
   expectLinear([](size_t count) { return "declare (:" + std::string(count, 'x') + ":)"; }, 8000000);
+}
+
+TEST(Parser, MutatedQueriesEndInAModuleOrAnError) {
+  const std::string seeds[] = {
+      "xquery version '1.0'; declare namespace p = 'u'; declare variable $x as xs:int? := 1; $x",
+      "for $a in //book[price > 10.5e3] where $a/@id = 'x' order by $a descending return <r "
+      "a='{1}'>"
+      "{$a} &amp;&#65; <![CDATA[c]]><!--d--><?e f?></r>",
+      "typeswitch (.) case element(a, b?)* return 1 default $d return (: x (: y :) :) f($d, *:n)",
+      "(:: pragma p:q r ::) declare function local:f($a) as item()+ { validate lax { 1 } }; 1 to 2",
+  };
+  const std::string bits = "(:){}<>/\"'&;$*@=.,-+ \n1ae\xC3\xA9";
+  std::minstd_rand random(20041029);
+  const auto below = [&random](size_t limit) { return random() % limit; };
+  for (int round = 0; round < 4000; ++round) {
+    std::string query = seeds[below(std::size(seeds))];
+    for (size_t changes = 1 + below(4); changes > 0; --changes) {
+      const size_t at = below(query.size());
+      switch (below(3)) {
+        case 0:
+          query.erase(at, 1 + below(6));
+          break;
+        case 1:
+          query.insert(at, 1, bits[below(bits.size())]);
+          break;
+        default:
+          query.insert(at, query.substr(below(query.size()), below(12)));
+          break;
+      }
+      if (query.empty()) query = "1";
+    }
+    const auto source = NSString::stringWithUTF8(query);
+    if (!source) continue;  // half a character
+    const auto parser = XQueryParser::parserWithSource(source);
+    EXPECT_TRUE(parser->parsedModule() || !parser->errors().empty() || isBlank(query)) << query;
+    for (const auto& error : parser->errors()) EXPECT_TRUE(error->msg()) << query;
+  }
 }
 
 TEST(Parser, ALongNameOfOtherLettersTakesLinearTime) {
