@@ -88,6 +88,7 @@ enum class Kind : uint8_t {
   WildCardNameTest,
   OperatorExpr,
   TypeDeclaration,
+  ForExpr,
   Param,
   NamespaceExpr,
   OtherExpr,

@@ -7,6 +7,11 @@
 
 namespace xquery {
 
+bool XQueryIsLimit(const XQueryError* error) {
+  return error && error->err() == 0 && error->msg() &&
+         error->msg()->view().startsWith(NSStringView::ascii("limit: "));
+}
+
 XQueryContextInternal::XQueryContextInternal() : _variables(std::make_shared<XQueryFrame>()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;

@@ -22,6 +22,10 @@ class XQueryProlog;
 using XQueryFrame = std::vector<Value>;
 using XQueryFrameRef = std::shared_ptr<XQueryFrame>;
 
+// Whether the error says that a limit of the engine was reached. Such an error ends the evaluation
+// even where others are passed over.
+bool XQueryIsLimit(const XQueryError* error);
+
 class XQueryContextInternal {
  public:
   XQueryContextInternal();

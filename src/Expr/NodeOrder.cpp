@@ -12,6 +12,8 @@
 // cannot be compared in the order in which it stands, whatever the comparator answers.
 #include "Expr/NodeOrder.h"
 
+#include "Expr/StableMergeSort.h"
+
 #include "xquery/Number.h"
 
 #include <algorithm>
@@ -63,26 +65,6 @@ Position positionByClimbing(const NSXMLNode* a, const NSXMLNode* b) {
   const int64_t indexOfB = at.b->index();
   if (indexOfA == indexOfB) return Position::Neither;
   return indexOfA < indexOfB ? Position::Before : Position::After;
-}
-
-// Sorts so that no element stands after one that it is `before`, as far as the relation allows.
-// Stable, and safe with a relation that is no order at all.
-template <class T, class Before>
-void mergeSort(std::vector<T>& items, Before before) {
-  std::vector<T> merged(items.size());
-  for (size_t width = 1; width < items.size(); width *= 2) {
-    for (size_t start = 0; start < items.size(); start += 2 * width) {
-      const size_t middle = std::min(start + width, items.size());
-      const size_t end = std::min(start + 2 * width, items.size());
-      size_t left = start;
-      size_t right = middle;
-      for (size_t out = start; out < end; ++out) {
-        const bool takeRight = left == middle || (right < end && before(items[right], items[left]));
-        merged[out] = std::move(items[takeRight ? right++ : left++]);
-      }
-    }
-    items.swap(merged);
-  }
 }
 
 const NSXMLNode* nodeOf(const Value& value) {
@@ -165,7 +147,7 @@ void XQuerySortNodesForward(std::vector<Value>& nodes) {
   if (allComparable(nodes)) {
     sortByOrderNumber(nodes);
   } else {
-    mergeSort(nodes, [](const Value& a, const Value& b) {
+    stableMergeSort(nodes, [](const Value& a, const Value& b) {
       return NodeDocOrderCompareForward(nodeOf(a), nodeOf(b)) < 0;
     });
   }
@@ -176,7 +158,7 @@ void XQuerySortNodesReverse(std::vector<Value>& nodes) {
     sortByOrderNumber(nodes);
     std::reverse(nodes.begin(), nodes.end());
   } else {
-    mergeSort(nodes, [](const Value& a, const Value& b) {
+    stableMergeSort(nodes, [](const Value& a, const Value& b) {
       return NodeDocOrderCompareReverse(nodeOf(a), nodeOf(b)) < 0;
     });
   }
@@ -198,7 +180,7 @@ void XQuerySortNodesForwardStable(std::vector<Value>& nodes) {
     const NSXMLNode* root = nodeOf(node)->rootNode();
     placed.push_back({std::move(node), root, placed.size()});
   }
-  mergeSort(placed, [](const Placed& a, const Placed& b) {
+  stableMergeSort(placed, [](const Placed& a, const Placed& b) {
     if (a.root != b.root) return a.place < b.place;
     return NodeDocOrderCompareForward(nodeOf(a.node), nodeOf(b.node)) < 0;
   });

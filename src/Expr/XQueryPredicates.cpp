@@ -33,11 +33,6 @@ Value itemAtPosition(const Value& items, uint64_t position) {
   return position == 1 ? items : NSNull::null();
 }
 
-bool isLimit(const XQueryError* error) {
-  return error && error->err() == 0 && error->msg() &&
-         error->msg()->view().startsWith(NSStringView::ascii("limit: "));
-}
-
 // A fraction is cut off, so that 2.5 selects the second item.
 bool selects(const Value& result, int64_t position, XQueryContext& context) {
   if (!result) return false;
@@ -56,7 +51,7 @@ bool keeps(const XQueryExpr& predicate, NSObject* item, int64_t position, XQuery
   try {
     return selects(predicate.evaluateWithContext(context), position, context);
   } catch (const NSException&) {
-    if (isLimit(dynamic.error().get())) throw;
+    if (XQueryIsLimit(dynamic.error().get())) throw;
     dynamic.setError(nullptr, false);
     return false;
   }

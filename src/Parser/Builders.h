@@ -11,6 +11,7 @@
 // answer the empty literal, so that the rest of the query is still checked.
 #pragma once
 
+#include "Expr/XQueryFLWOR.h"
 #include "xquery/Object.h"
 
 #include <cstdint>
@@ -80,9 +81,8 @@ NSObject* XQOrderSpecList(NSObject* spec);
 NSObject* XQOrderSpecListAdd(NSObject* specs, NSObject* spec);
 NSObject* XQOrderSpec(NSObject* expr, NSObject* modifier, int64_t line);
 // What an order modifier says of empty values; without a word the prolog decides.
-enum XQueryEmptyOrder { XQueryEmptyUnspecified, XQueryEmptyLeast, XQueryEmptyGreatest };
-NSObject* XQOrderModifier(bool ascending, XQueryEmptyOrder empty, NSObject* collation,
-                          int64_t line);
+NSObject* XQOrderModifier(bool ascending, XQueryOrderSpec::EmptyOrder emptyOrder,
+                          NSObject* collation, int64_t line);
 NSObject* XQSome(NSObject* items, NSObject* condition, int64_t line);
 NSObject* XQEvery(NSObject* items, NSObject* condition, int64_t line);
 NSObject* XQQuantifiedExprItem(NSObject* name, NSObject* type, NSObject* expr, int64_t line);

@@ -1,5 +1,10 @@
+#include "Expr/XQueryConditional.h"
+#include "Expr/XQueryFLWOR.h"
 #include "Expr/XQueryLists.h"
 #include "Expr/XQueryOperatorExpr.h"
+#include "Expr/XQueryQuantified.h"
+#include "Expr/XQueryTypeExprs.h"
+#include "Expr/XQueryTypeswitch.h"
 #include "Parser/BuilderSupport.h"
 #include "Parser/XQueryTokens.h"
 #include "Types/XQueryErrors.h"
@@ -50,10 +55,6 @@ int operatorCode(int token) {
   return row == std::end(operatorCodes) ? 0 : row->code;
 }
 
-constexpr const char* flwor = "FLWOR expressions";
-constexpr const char* quantified = "quantified expressions";
-constexpr const char* typeswitch = "typeswitch expressions";
-
 // A literal of more digits than a decimal holds is an error of the query, never another number.
 NSObject* XQDigits(Ref<XQueryLiteral> literal, int64_t line) {
   if (literal) return XQAtLine(std::move(literal), line);
@@ -74,8 +75,12 @@ NSObject* XQExprAdd(NSObject* list, NSObject* expr) {
   return list;
 }
 
-NSObject* XQFLWRExpr(NSObject*, NSObject*, NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(flwor, line);
+NSObject* XQFLWRExpr(NSObject* clauses, NSObject* whereExpr, NSObject* orderSpecs,
+                     NSObject* returnExpr, int64_t line) {
+  return XQAtLine(XQueryFLWORExpr::exprWithForLet(
+                      XQVector<XQueryBindingExpr>(clauses), XQRef<XQueryExpr>(whereExpr),
+                      XQVector<XQueryOrderSpec>(orderSpecs), XQRef<XQueryExpr>(returnExpr)),
+                  line);
 }
 
 NSObject* XQForLetClauses(NSObject* clauses) {
@@ -86,8 +91,12 @@ NSObject* XQForLetClausesAdd(NSObject* clauses, NSObject* more) {
   return XQListAddAll(clauses, more);
 }
 
-NSObject* XQForClause(NSObject*, NSObject*, NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(flwor, line);
+NSObject* XQForClause(NSObject* name, NSObject* type, NSObject* position, NSObject* expr,
+                      int64_t line) {
+  return XQAtLine(
+      XQueryForExpr::exprWithName(XQRef<NSString>(name), XQRef<XQueryTypeDeclaration>(type),
+                                  XQRef<NSString>(position), XQRef<XQueryExpr>(expr)),
+      line);
 }
 
 NSObject* XQForClauseItems(NSObject* clause) {
@@ -98,8 +107,11 @@ NSObject* XQForClauseItemsAdd(NSObject* clauses, NSObject* clause) {
   return XQListAdd(clauses, clause);
 }
 
-NSObject* XQLetClause(NSObject*, NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(flwor, line);
+NSObject* XQLetClause(NSObject* name, NSObject* type, NSObject* expr, int64_t line) {
+  return XQAtLine(
+      XQueryLetExpr::exprWithName(XQRef<NSString>(name), XQRef<XQueryTypeDeclaration>(type),
+                                  XQRef<XQueryExpr>(expr)),
+      line);
 }
 
 NSObject* XQLetClauseItems(NSObject* clause) {
@@ -126,24 +138,41 @@ NSObject* XQOrderSpecListAdd(NSObject* specs, NSObject* spec) {
   return XQListAdd(specs, spec);
 }
 
-NSObject* XQOrderSpec(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(flwor, line);
+NSObject* XQOrderSpec(NSObject* expr, NSObject* modifier, int64_t line) {
+  if (!modifier) {
+    return XQAtLine(XQueryOrderSpec::orderSpec(XQRef<XQueryExpr>(expr), true,
+                                               XQueryOrderSpec::EmptyUnspecified, nullptr),
+                    line);
+  }
+  auto* spec = cast<XQueryOrderSpec>(modifier);
+  spec->setExpr(XQRef<XQueryExpr>(expr));
+  spec->setExprLine(line);
+  return spec;
 }
 
-NSObject* XQOrderModifier(bool, XQueryEmptyOrder, NSObject*, int64_t line) {
-  return XQUnavailable(flwor, line);
+NSObject* XQOrderModifier(bool ascending, XQueryOrderSpec::EmptyOrder emptyOrder,
+                          NSObject* collation, int64_t line) {
+  return XQAtLine(
+      XQueryOrderSpec::orderSpec(nullptr, ascending, emptyOrder, XQRef<NSString>(collation)), line);
 }
 
-NSObject* XQSome(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(quantified, line);
+NSObject* XQSome(NSObject* items, NSObject* condition, int64_t line) {
+  return XQAtLine(XQueryQuantifiedExpr::someExpr(XQVector<XQueryQuantifiedExprItem>(items),
+                                                 XQRef<XQueryExpr>(condition)),
+                  line);
 }
 
-NSObject* XQEvery(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(quantified, line);
+NSObject* XQEvery(NSObject* items, NSObject* condition, int64_t line) {
+  return XQAtLine(XQueryQuantifiedExpr::everyExpr(XQVector<XQueryQuantifiedExprItem>(items),
+                                                  XQRef<XQueryExpr>(condition)),
+                  line);
 }
 
-NSObject* XQQuantifiedExprItem(NSObject*, NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(quantified, line);
+NSObject* XQQuantifiedExprItem(NSObject* name, NSObject* type, NSObject* expr, int64_t line) {
+  return XQAtLine(
+      XQueryQuantifiedExprItem::quantifiedExpr(XQRef<XQueryExpr>(expr), XQRef<NSString>(name),
+                                               XQRef<XQueryTypeDeclaration>(type)),
+      line);
 }
 
 NSObject* XQQuantifiedExprItems(NSObject* item) {
@@ -154,12 +183,17 @@ NSObject* XQQuantifiedExprItemsAdd(NSObject* items, NSObject* item) {
   return XQListAdd(items, item);
 }
 
-NSObject* XQTypeswitchExpr(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(typeswitch, line);
+NSObject* XQTypeswitchExpr(NSObject* expr, NSObject* caseClauses, int64_t line) {
+  return XQAtLine(XQueryTypeswitchExpr::expr(XQRef<XQueryExpr>(expr),
+                                             XQVector<XQueryCaseClauseExpr>(caseClauses)),
+                  line);
 }
 
-NSObject* XQCaseClause(NSObject*, NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(typeswitch, line);
+NSObject* XQCaseClause(NSObject* name, NSObject* type, NSObject* expr, int64_t line) {
+  return XQAtLine(
+      XQueryCaseClauseExpr::exprWithName(XQRef<NSString>(name), XQRef<XQueryTypeDeclaration>(type),
+                                         XQRef<XQueryExpr>(expr)),
+      line);
 }
 
 NSObject* XQCaseClauses(NSObject* clause) {
@@ -170,8 +204,11 @@ NSObject* XQCaseClausesAdd(NSObject* clauses, NSObject* clause) {
   return XQListAdd(clauses, clause);
 }
 
-NSObject* XQIfThenElse(NSObject*, NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable("conditional expressions", line);
+NSObject* XQIfThenElse(NSObject* test, NSObject* thenExpr, NSObject* elseExpr, int64_t line) {
+  return XQAtLine(
+      XQueryConditionalExpr::condionalExpr(XQRef<XQueryExpr>(test), XQRef<XQueryExpr>(thenExpr),
+                                           XQRef<XQueryExpr>(elseExpr)),
+      line);
 }
 
 NSObject* XQOperator(int token, NSObject* right, int64_t line) {
@@ -189,20 +226,27 @@ NSObject* XQOperatorSetLeft(NSObject* chain, NSObject* left) {
   return chain;
 }
 
-NSObject* XQInstanceOfExpr(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable("instance of expressions", line);
+NSObject* XQInstanceOfExpr(NSObject* expr, NSObject* type, int64_t line) {
+  return XQAtLine(XQueryInstanceOfExpr::instanceOfExpr(XQRef<XQueryExpr>(expr),
+                                                       XQRef<XQueryTypeDeclaration>(type)),
+                  line);
 }
 
-NSObject* XQTreatExpr(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable("treat as expressions", line);
+NSObject* XQTreatExpr(NSObject* expr, NSObject* type, int64_t line) {
+  return XQAtLine(
+      XQueryTreatExpr::treatExpr(XQRef<XQueryExpr>(expr), XQRef<XQueryTypeDeclaration>(type)),
+      line);
 }
 
-NSObject* XQCastableExpr(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable("castable as expressions", line);
+NSObject* XQCastableExpr(NSObject* expr, NSObject* type, int64_t line) {
+  return XQAtLine(
+      XQueryCastableExpr::castableExpr(XQRef<XQueryExpr>(expr), XQRef<XQueryTypeDeclaration>(type)),
+      line);
 }
 
-NSObject* XQCastExpr(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable("cast as expressions", line);
+NSObject* XQCastExpr(NSObject* expr, NSObject* type, int64_t line) {
+  return XQAtLine(
+      XQueryCastExpr::castExpr(XQRef<XQueryExpr>(expr), XQRef<XQueryTypeDeclaration>(type)), line);
 }
 
 // The context item is one shared object and carries no line.
@@ -234,8 +278,8 @@ NSObject* XQEmptyLiteral(int64_t line) {
   return XQAtLine(XQueryLiteral::literalWithValue(Value(NSNull::null())), line);
 }
 
-NSObject* XQOrderedExpr(NSObject*, bool, int64_t line) {
-  return XQUnavailable("ordered and unordered expressions", line);
+NSObject* XQOrderedExpr(NSObject* expr, bool ordered, int64_t line) {
+  return XQAtLine(XQueryOrderExpr::orderExpr(XQRef<XQueryExpr>(expr), ordered), line);
 }
 
 NSObject* XQFunctionCall(NSObject*, NSObject*, int64_t line) {

@@ -698,39 +698,39 @@ OrderSpec:
 
 OrderModifier:
     kTokenAscending kTokenEmptyGreatest kTokenCollation kTokenStringLiteral
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyGreatest, $4.value, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyGreatest, $4.value, $1.line)); }
   | kTokenAscending kTokenEmptyLeast kTokenCollation kTokenStringLiteral
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyLeast, $4.value, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyLeast, $4.value, $1.line)); }
   | kTokenAscending kTokenEmptyGreatest
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyGreatest, nullptr, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyGreatest, nullptr, $1.line)); }
   | kTokenAscending kTokenEmptyLeast
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyLeast, nullptr, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyLeast, nullptr, $1.line)); }
   | kTokenAscending kTokenCollation kTokenStringLiteral
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyUnspecified, $3.value, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyUnspecified, $3.value, $1.line)); }
   | kTokenAscending
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyUnspecified, nullptr, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyUnspecified, nullptr, $1.line)); }
   | kTokenDescending kTokenEmptyGreatest kTokenCollation kTokenStringLiteral
-      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryEmptyGreatest, $4.value, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryOrderSpec::EmptyGreatest, $4.value, $1.line)); }
   | kTokenDescending kTokenEmptyLeast kTokenCollation kTokenStringLiteral
-      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryEmptyLeast, $4.value, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryOrderSpec::EmptyLeast, $4.value, $1.line)); }
   | kTokenDescending kTokenEmptyGreatest
-      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryEmptyGreatest, nullptr, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryOrderSpec::EmptyGreatest, nullptr, $1.line)); }
   | kTokenDescending kTokenEmptyLeast
-      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryEmptyLeast, nullptr, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryOrderSpec::EmptyLeast, nullptr, $1.line)); }
   | kTokenDescending kTokenCollation kTokenStringLiteral
-      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryEmptyUnspecified, $3.value, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryOrderSpec::EmptyUnspecified, $3.value, $1.line)); }
   | kTokenDescending
-      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryEmptyUnspecified, nullptr, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(false, XQueryOrderSpec::EmptyUnspecified, nullptr, $1.line)); }
   | kTokenEmptyGreatest kTokenCollation kTokenStringLiteral
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyGreatest, $3.value, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyGreatest, $3.value, $1.line)); }
   | kTokenEmptyLeast kTokenCollation kTokenStringLiteral
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyLeast, $3.value, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyLeast, $3.value, $1.line)); }
   | kTokenEmptyGreatest
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyGreatest, nullptr, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyGreatest, nullptr, $1.line)); }
   | kTokenEmptyLeast
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyLeast, nullptr, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyLeast, nullptr, $1.line)); }
   | kTokenCollation kTokenStringLiteral
-      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryEmptyUnspecified, $2.value, $1.line)); }
+      { $$ = XQValue($1.line, XQOrderModifier(true, XQueryOrderSpec::EmptyUnspecified, $2.value, $1.line)); }
   ;
 
 QuantifiedExpr:

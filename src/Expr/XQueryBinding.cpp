@@ -1,0 +1,30 @@
+#include "Expr/XQueryBinding.h"
+
+#include "Prolog/XQueryProlog.h"
+#include "xquery/Collection.h"
+
+namespace xquery {
+
+int64_t XQueryDeclareLocalVariable(const Ref<NSString>& name, XQueryProlog& prolog) {
+  if (!name || name->length() == 0) return 0;
+  const auto qName = prolog.variableQNameFromString(name);
+  return qName ? prolog.newLocalVariableIDForQName(qName) : 0;
+}
+
+Value XQueryEvaluateOrEmpty(const XQueryExpr* expr, XQueryContext& context) {
+  return expr ? expr->evaluateWithContext(context) : Value(NSNull::null());
+}
+
+Value XQueryBindingExpr::evaluateWithContext(XQueryContext& context) const {
+  return XQueryEvaluateOrEmpty(_expr.get(), context);
+}
+
+void XQueryBindingExpr::bindType(XQueryProlog& prolog) {
+  if (_type) _type->bindInfoForProlog(prolog);
+}
+
+void XQueryBindingExpr::bindExpr(XQueryProlog& prolog) {
+  if (_expr) _expr->bindInfoForProlog(prolog);
+}
+
+}  // namespace xquery

@@ -1,0 +1,50 @@
+// What every expression that binds a variable has: the clauses of FLWOR and quantified expressions
+// and the cases of a typeswitch.
+#pragma once
+
+#include "Expr/XQueryExpr.h"
+#include "Expr/XQueryTypeDeclaration.h"
+#include "xquery/String.h"
+
+#include <utility>
+
+namespace xquery {
+
+// Hands out the next local variable ID for the name; 0 for no name and for one that does not
+// resolve.
+int64_t XQueryDeclareLocalVariable(const Ref<NSString>& name, XQueryProlog& prolog);
+
+// Evaluates an expression that may be absent; an absent one is the empty sequence.
+Value XQueryEvaluateOrEmpty(const XQueryExpr* expr, XQueryContext& context);
+
+class XQueryBindingExpr : public XQueryExpr {
+ public:
+  // Null when the clause declares no type.
+  XQueryTypeDeclaration* type() const { return _type.get(); }
+  XQueryExpr* expr() const { return _expr.get(); }
+  // The local variable that takes the value; 0 until bound, and when there is none.
+  int64_t varID() const { return _varID; }
+
+  // The value that the variable takes, or what a case answers.
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  // `type` and `expr` may be null; `varName` may be null or empty.
+  XQueryBindingExpr(Ref<NSString> varName, Ref<XQueryTypeDeclaration> type, Ref<XQueryExpr> expr)
+      : XQueryExpr(Kind::OtherExpr),
+        _varName(std::move(varName)),
+        _type(std::move(type)),
+        _expr(std::move(expr)) {}
+  void bindType(XQueryProlog& prolog);
+  void bindExpr(XQueryProlog& prolog);
+  void declareVariable(XQueryProlog& prolog) {
+    _varID = XQueryDeclareLocalVariable(_varName, prolog);
+  }
+
+  Ref<NSString> _varName;
+  Ref<XQueryTypeDeclaration> _type;
+  Ref<XQueryExpr> _expr;
+  int64_t _varID = 0;
+};
+
+}  // namespace xquery

@@ -1,0 +1,37 @@
+// if (...) then ... else ...
+#pragma once
+
+#include "Expr/XQueryExpr.h"
+
+#include <utility>
+
+namespace xquery {
+
+class XQueryConditionalExpr : public XQueryExpr {
+ public:
+  // A missing branch is null and stands for the empty sequence. The misspelling belongs to the
+  // name.
+  [[nodiscard]] static Ref<XQueryConditionalExpr> condionalExpr(Ref<XQueryExpr> test,
+                                                                Ref<XQueryExpr> thenExpr,
+                                                                Ref<XQueryExpr> elseExpr);
+
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryConditionalExpr(Ref<XQueryExpr> intWithTestExpr, Ref<XQueryExpr> thenExpr,
+                        Ref<XQueryExpr> elseExpr)
+      : XQueryExpr(Kind::OtherExpr),
+        _test(std::move(intWithTestExpr)),
+        _then(std::move(thenExpr)),
+        _else(std::move(elseExpr)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<XQueryExpr> _test;
+  Ref<XQueryExpr> _then;
+  Ref<XQueryExpr> _else;
+};
+
+}  // namespace xquery

@@ -1,0 +1,238 @@
+#include "Expr/XQueryFLWOR.h"
+
+#include "Eval/StackGuard.h"
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryFLWORSort.h"
+#include "Prolog/XQueryProlog.h"
+#include "Types/XQueryAtomization.h"
+#include "Types/XQueryCasting.h"
+#include "Types/XQueryErrors.h"
+#include "xquery/Collection.h"
+#include "xquery/Number.h"
+
+#include <memory>
+
+namespace xquery {
+
+// What the tuples have yielded: values, or items with their keys when there are order specs.
+class XQueryFLWORResults {
+ public:
+  void add(Value value) { _values.add(std::move(value)); }
+  // Every item of the value, in order, with the keys of its tuple.
+  void add(const Value& value, std::vector<Value> keys) {
+    const XQueryItemList list(value.get());
+    if (list.count() == 0) return;
+    const auto shared = std::make_shared<const std::vector<Value>>(std::move(keys));
+    for (size_t i = 0; i < list.count(); ++i) _sortItems.push_back({list[i], shared, i});
+  }
+  Value value() { return _values.value(); }
+  std::vector<XQuerySortItem>& sortItems() { return _sortItems; }
+
+ private:
+  XQueryGatherer _values;
+  std::vector<XQuerySortItem> _sortItems;
+};
+
+// --- clauses -------------------------------------------------------------------------------------
+
+XQueryForExpr::XQueryForExpr(Ref<NSString> name, Ref<XQueryTypeDeclaration> type,
+                             Ref<NSString> position, Ref<XQueryExpr> expr)
+    : XQueryBindingExpr(std::move(name), std::move(type), std::move(expr)),
+      _posVarName(std::move(position)) {
+  _kind = Kind::ForExpr;
+}
+
+Ref<XQueryForExpr> XQueryForExpr::exprWithName(Ref<NSString> name, Ref<XQueryTypeDeclaration> type,
+                                               Ref<NSString> position, Ref<XQueryExpr> expr) {
+  return make<XQueryForExpr>(std::move(name), std::move(type), std::move(position),
+                             std::move(expr));
+}
+
+// The variable is declared last, so that the clause's own expression still sees an outer one of the
+// same name.
+void XQueryForExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  bindType(prolog);
+  bindExpr(prolog);
+  declareVariable(prolog);
+  _posVarID = XQueryDeclareLocalVariable(_posVarName, prolog);
+}
+
+Ref<XQueryLetExpr> XQueryLetExpr::exprWithName(Ref<NSString> name, Ref<XQueryTypeDeclaration> type,
+                                               Ref<XQueryExpr> expr) {
+  return make<XQueryLetExpr>(std::move(name), std::move(type), std::move(expr));
+}
+
+void XQueryLetExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  bindType(prolog);
+  bindExpr(prolog);
+  declareVariable(prolog);
+}
+
+XQueryOrderSpec::XQueryOrderSpec(Ref<XQueryExpr> expr, bool ascending, EmptyOrder emptyOrder,
+                                 Ref<NSString> collation)
+    : XQueryExpr(Kind::OtherExpr),
+      _expr(std::move(expr)),
+      _ascending(ascending),
+      _emptyOrder(emptyOrder),
+      _collation(std::move(collation)) {}
+
+Ref<XQueryOrderSpec> XQueryOrderSpec::orderSpec(Ref<XQueryExpr> expr, bool ascending,
+                                                EmptyOrder emptyLeast, Ref<NSString> collation) {
+  return make<XQueryOrderSpec>(std::move(expr), ascending, emptyLeast, std::move(collation));
+}
+
+void XQueryOrderSpec::bindInfoForProlog(XQueryProlog& prolog) {
+  if (_emptyOrder == EmptyUnspecified) {
+    _emptyOrder = prolog.emptyLeast() ? EmptyLeast : EmptyGreatest;
+  }
+  if (_expr) _expr->bindInfoForProlog(prolog);
+}
+
+Value XQueryOrderSpec::evaluateWithContext(XQueryContext& context) const {
+  return XQueryEvaluateOrEmpty(_expr.get(), context);
+}
+
+// --- the expression ------------------------------------------------------------------------------
+
+XQueryFLWORExpr::XQueryFLWORExpr(Clauses forLet, Ref<XQueryExpr> whereExpr, OrderSpecs orderSpecs,
+                                 Ref<XQueryExpr> returnExpr)
+    : XQueryExpr(Kind::OtherExpr),
+      _forLet(std::move(forLet)),
+      _whereExpr(std::move(whereExpr)),
+      _orderSpecs(std::move(orderSpecs)),
+      _returnExpr(std::move(returnExpr)) {}
+
+Ref<XQueryFLWORExpr> XQueryFLWORExpr::exprWithForLet(Clauses forLet, Ref<XQueryExpr> whereExpr,
+                                                     OrderSpecs orderSpecs,
+                                                     Ref<XQueryExpr> returnExpr) {
+  return make<XQueryFLWORExpr>(std::move(forLet), std::move(whereExpr), std::move(orderSpecs),
+                               std::move(returnExpr));
+}
+
+void XQueryFLWORExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  if (!XQueryCheckStack(prolog)) return;
+  // The variables end with the expression: later siblings use their IDs again.
+  const auto scope = prolog.localScope();
+  for (const auto& clause : _forLet) clause->bindInfoForProlog(prolog);
+  if (_whereExpr) _whereExpr->bindInfoForProlog(prolog);
+  for (const auto& spec : _orderSpecs) spec->bindInfoForProlog(prolog);
+  if (_returnExpr) _returnExpr->bindInfoForProlog(prolog);
+  prolog.restoreLocalScope(scope);
+}
+
+void XQueryFLWORExpr::checkType(const XQueryBindingExpr& clause, const NSObject* value,
+                                XQueryContext& context) const {
+  if (clause.type() && !XQueryInstanceOf(value, *clause.type(), &context)) {
+    context._internal().raise(XQueryErrors::invalidType.errorAtLine(clause.exprLine()));
+  }
+}
+
+void XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toResults,
+                                         XQueryContext& withContext) const {
+  XQueryCheckStack(withContext);
+  for (; clause < _forLet.size(); ++clause) {
+    const XQueryBindingExpr& binding = *_forLet[clause];
+    if (const auto* forExpr = dyn_cast<XQueryForExpr>(&binding)) {
+      evaluateFor(*forExpr, clause, toResults, withContext);
+      return;
+    }
+    const Value value = binding.evaluateWithContext(withContext);
+    checkType(binding, value.get(), withContext);
+    withContext._internal().setVariable(value, binding.varID());
+  }
+  processItem(toResults, withContext);
+}
+
+void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
+                                  XQueryFLWORResults& toResults, XQueryContext& withContext) const {
+  auto& dynamic = withContext._internal();
+  Value value = clause.evaluateWithContext(withContext);
+  // A sequence is flat already; other arrays may hold anything.
+  if (value && value->kind() == Kind::Array) value = XQuerySequence::sequenceWithItem(value);
+  const XQueryItemList items(value.get());
+  const bool isLast = index + 1 == _forLet.size();
+  for (size_t k = 0; k < items.count(); ++k) {
+    checkType(clause, items[k], withContext);
+    dynamic.setVariable(items[k], clause.varID());
+    if (clause.posVarID()) {
+      dynamic.setVariable(NSNumber::numberWithLongLong(static_cast<int64_t>(k) + 1),
+                          clause.posVarID());
+    }
+    if (isLast) {
+      processItem(toResults, withContext);
+    } else {
+      evaluateStartingAt(index + 1, toResults, withContext);
+    }
+  }
+}
+
+void XQueryFLWORExpr::processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const {
+  if (_whereExpr) {
+    const Value where = _whereExpr->evaluateWithContext(withContext);
+    // Only false drops the tuple: an error record lets it through.
+    if (XQueryEffectiveBooleanValue(where, withContext) == NSNumber::falseValue()) return;
+  }
+  Value value = XQueryEvaluateOrEmpty(_returnExpr.get(), withContext);
+  if (_orderSpecs.empty()) {
+    toResults.add(std::move(value));
+  } else {
+    toResults.add(value, orderKeys(withContext));
+  }
+}
+
+std::vector<Value> XQueryFLWORExpr::orderKeys(XQueryContext& context) const {
+  std::vector<Value> keys;
+  keys.reserve(_orderSpecs.size());
+  for (const auto& spec : _orderSpecs) {
+    Value key = XQueryAtomizationCheckingOccurrence(spec->evaluateWithContext(context),
+                                                    XQueryOccurrenceAnyAlso, context);
+    if (XQueryObjectTypeID(key.get()) == XQueryTypeUntypedAtomic) {
+      key = XQueryCastAsTypeForContext(key, XQueryTypeString, context);
+    }
+    keys.push_back(std::move(key));
+  }
+  return keys;
+}
+
+Value XQueryFLWORExpr::evaluateWithContext(XQueryContext& context) const {
+  XQueryFLWORResults results;
+  evaluateStartingAt(0, results, context);
+  if (_orderSpecs.empty()) return results.value();
+
+  std::vector<XQuerySortItem>& items = results.sortItems();
+  const XQueryOrderSpec& first = *_orderSpecs.front();
+  if (!XQueryFLWORSort(items, first.ascending(), first.emptyLeast())) {
+    context._internal().raise(XQueryErrors::invalidType.errorAtLine(exprLine()));
+  }
+  auto sorted = XQuerySequence::sequence();
+  sorted->objects().reserve(items.size());
+  for (XQuerySortItem& item : items) sorted->addObject(item.value);
+  return normalised(std::move(sorted));
+}
+
+// --- ordering mode -------------------------------------------------------------------------------
+
+Ref<XQueryOrderExpr> XQueryOrderExpr::orderExpr(Ref<XQueryExpr> expr, bool ordered) {
+  return make<XQueryOrderExpr>(std::move(expr), ordered);
+}
+
+void XQueryOrderExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  if (_expr && XQueryCheckStack(prolog)) _expr->bindInfoForProlog(prolog);
+}
+
+Value XQueryOrderExpr::evaluateWithContext(XQueryContext& context) const {
+  XQueryCheckStack(context);
+  auto& dynamic = context._internal();
+  const bool saved = dynamic.ordered();
+  dynamic.setOrdered(_ordered);
+  try {
+    Value value = XQueryEvaluateOrEmpty(_expr.get(), context);
+    dynamic.setOrdered(saved);
+    return value;
+  } catch (...) {
+    dynamic.setOrdered(saved);
+    throw;
+  }
+}
+
+}  // namespace xquery

@@ -1,0 +1,144 @@
+// The FLWOR expression and the expressions that switch the ordering mode.
+#pragma once
+
+#include "Expr/XQueryBinding.h"
+#include "Expr/XQueryExpr.h"
+#include "Expr/XQuerySequence.h"
+
+#include <utility>
+#include <vector>
+
+namespace xquery {
+
+class XQueryFLWORResults;
+
+class XQueryForExpr : public XQueryBindingExpr {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::ForExpr; }
+
+  // `type` may be null; `position` is the name after "at", null or empty without one.
+  [[nodiscard]] static Ref<XQueryForExpr> exprWithName(Ref<NSString> name,
+                                                       Ref<XQueryTypeDeclaration> type,
+                                                       Ref<NSString> position,
+                                                       Ref<XQueryExpr> expr);
+
+  // 0 without a positional variable.
+  int64_t posVarID() const { return _posVarID; }
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+
+ protected:
+  XQueryForExpr(Ref<NSString> name, Ref<XQueryTypeDeclaration> type, Ref<NSString> position,
+                Ref<XQueryExpr> expr);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<NSString> _posVarName;
+  int64_t _posVarID = 0;
+};
+
+class XQueryLetExpr : public XQueryBindingExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryLetExpr> exprWithName(Ref<NSString> name,
+                                                       Ref<XQueryTypeDeclaration> type,
+                                                       Ref<XQueryExpr> expr);
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+
+ protected:
+  using XQueryBindingExpr::XQueryBindingExpr;
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+};
+
+// One key of an order by clause.
+class XQueryOrderSpec : public XQueryExpr {
+ public:
+  enum EmptyOrder : int { EmptyUnspecified, EmptyLeast, EmptyGreatest };
+
+  // An unspecified empty order takes the prolog's when the query is bound. The collation may be
+  // null; it is kept and not consulted.
+  [[nodiscard]] static Ref<XQueryOrderSpec> orderSpec(Ref<XQueryExpr> expr, bool ascending,
+                                                      EmptyOrder emptyLeast,
+                                                      Ref<NSString> collation);
+
+  XQueryExpr* expr() const { return _expr.get(); }
+  void setExpr(Ref<XQueryExpr> expr) { _expr = std::move(expr); }
+  bool ascending() const { return _ascending; }
+  bool emptyLeast() const { return _emptyOrder != EmptyGreatest; }
+  const Ref<NSString>& collation() const { return _collation; }
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryOrderSpec(Ref<XQueryExpr> expr, bool ascending, EmptyOrder emptyOrder,
+                  Ref<NSString> collation);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<XQueryExpr> _expr;
+  bool _ascending;
+  EmptyOrder _emptyOrder;
+  Ref<NSString> _collation;
+};
+
+// Tuples are produced by recursion over the clauses and never gathered. With order by keys each
+// result item is kept together with the keys of its tuple and everything is sorted once at the end.
+class XQueryFLWORExpr : public XQueryExpr {
+ public:
+  using Clauses = std::vector<Ref<XQueryBindingExpr>>;  // XQueryForExpr and XQueryLetExpr
+  using OrderSpecs = std::vector<Ref<XQueryOrderSpec>>;
+
+  // `whereExpr` may be null, `orderSpecs` empty.
+  [[nodiscard]] static Ref<XQueryFLWORExpr> exprWithForLet(Clauses forLet,
+                                                           Ref<XQueryExpr> whereExpr,
+                                                           OrderSpecs orderSpecs,
+                                                           Ref<XQueryExpr> returnExpr);
+
+  const OrderSpecs& orderSpecs() const { return _orderSpecs; }
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryFLWORExpr(Clauses forLet, Ref<XQueryExpr> whereExpr, OrderSpecs orderSpecs,
+                  Ref<XQueryExpr> returnExpr);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  void evaluateStartingAt(size_t clause, XQueryFLWORResults& toResults,
+                          XQueryContext& withContext) const;
+  void evaluateFor(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
+                   XQueryContext& withContext) const;
+  void processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
+  void checkType(const XQueryBindingExpr& clause, const NSObject* value,
+                 XQueryContext& context) const;
+  std::vector<Value> orderKeys(XQueryContext& context) const;
+
+  Clauses _forLet;
+  Ref<XQueryExpr> _whereExpr;
+  OrderSpecs _orderSpecs;
+  Ref<XQueryExpr> _returnExpr;
+};
+
+// "ordered {...}" and "unordered {...}": the ordering mode for the extent of the operand.
+class XQueryOrderExpr : public XQueryExpr {
+ public:
+  // `expr` may be null: the empty sequence.
+  [[nodiscard]] static Ref<XQueryOrderExpr> orderExpr(Ref<XQueryExpr> expr, bool ordered);
+
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryOrderExpr(Ref<XQueryExpr> expr, bool ordered)
+      : XQueryExpr(Kind::OtherExpr), _expr(std::move(expr)), _ordered(ordered) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<XQueryExpr> _expr;
+  bool _ordered;
+};
+
+}  // namespace xquery

@@ -1,0 +1,82 @@
+#include "Expr/XQueryQuantified.h"
+
+#include "Eval/StackGuard.h"
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQuerySequence.h"
+#include "Types/XQueryAtomization.h"
+#include "Types/XQueryErrors.h"
+
+namespace xquery {
+
+Ref<XQueryQuantifiedExprItem> XQueryQuantifiedExprItem::quantifiedExpr(
+    Ref<XQueryExpr> expr, Ref<NSString> forVar, Ref<XQueryTypeDeclaration> type) {
+  return make<XQueryQuantifiedExprItem>(std::move(forVar), std::move(type), std::move(expr));
+}
+
+void XQueryQuantifiedExprItem::bindInfoForProlog(XQueryProlog& prolog) {
+  bindExpr(prolog);
+  bindType(prolog);
+  declareVariable(prolog);
+}
+
+XQueryQuantifiedExpr::XQueryQuantifiedExpr(Items items, Ref<XQueryExpr> satisfies, bool every)
+    : XQueryExpr(Kind::OtherExpr),
+      _items(std::move(items)),
+      _satisfies(std::move(satisfies)),
+      _every(every) {}
+
+Ref<XQueryQuantifiedExpr> XQueryQuantifiedExpr::someExpr(Items items, Ref<XQueryExpr> satisfies) {
+  return make<XQueryQuantifiedExpr>(std::move(items), std::move(satisfies), false);
+}
+
+Ref<XQueryQuantifiedExpr> XQueryQuantifiedExpr::everyExpr(Items items, Ref<XQueryExpr> satisfies) {
+  return make<XQueryQuantifiedExpr>(std::move(items), std::move(satisfies), true);
+}
+
+// The variables keep their IDs for the rest of the module: the scope is not put back.
+void XQueryQuantifiedExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  if (!XQueryCheckStack(prolog)) return;
+  for (const auto& item : _items) item->bindInfoForProlog(prolog);
+  if (_satisfies) _satisfies->bindInfoForProlog(prolog);
+}
+
+Value XQueryQuantifiedExpr::evaluateWithContext(XQueryContext& context) const {
+  Value answer = evaluatePostion(0, context);
+  if (!answer) context._internal().raise(XQueryErrors::invalidType.errorAtLine(exprLine()));
+  return answer;
+}
+
+Value XQueryQuantifiedExpr::evaluatePostion(size_t index, XQueryContext& withContext) const {
+  XQueryCheckStack(withContext);
+  if (index == _items.size()) {
+    return XQueryEffectiveBooleanValue(XQueryEvaluateOrEmpty(_satisfies.get(), withContext),
+                                       withContext);
+  }
+  // A clause without items does not decide: the next one is tried in its place, and goes on with
+  // the clause after this one.
+  for (size_t clause = index; clause < _items.size(); ++clause) {
+    if (Value answer = evaluateItems(clause, index, withContext)) return answer;
+  }
+  return NSNumber::numberWithBool(_every);
+}
+
+// The answer over the items of one clause; null when it has none.
+Value XQueryQuantifiedExpr::evaluateItems(size_t clause, size_t index,
+                                          XQueryContext& context) const {
+  const XQueryQuantifiedExprItem& binding = *_items[clause];
+  const Value value = binding.evaluateWithContext(context);
+  const XQueryItemList items(value.get());
+  const NSNumber* undecided = _every ? NSNumber::trueValue() : NSNumber::falseValue();
+  Value answer;
+  for (size_t i = 0; i < items.count(); ++i) {
+    if (binding.type() && !XQueryInstanceOf(items[i], *binding.type(), &context)) {
+      return XQueryErrors::invalidType.errorAtLine(binding.exprLine());
+    }
+    context._internal().setVariable(items[i], binding.varID());
+    answer = evaluatePostion(index + 1, context);
+    if (answer.get() != undecided) break;
+  }
+  return answer;
+}
+
+}  // namespace xquery

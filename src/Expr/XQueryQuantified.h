@@ -1,0 +1,51 @@
+// some $x in ... satisfies ..., every $x in ... satisfies ...
+#pragma once
+
+#include "Expr/XQueryBinding.h"
+#include "Expr/XQueryExpr.h"
+
+#include <vector>
+
+namespace xquery {
+
+// One variable clause.
+class XQueryQuantifiedExprItem : public XQueryBindingExpr {
+ public:
+  // `type` may be null.
+  [[nodiscard]] static Ref<XQueryQuantifiedExprItem> quantifiedExpr(
+      Ref<XQueryExpr> expr, Ref<NSString> forVar, Ref<XQueryTypeDeclaration> type);
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+
+ protected:
+  using XQueryBindingExpr::XQueryBindingExpr;
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+};
+
+class XQueryQuantifiedExpr : public XQueryExpr {
+ public:
+  using Items = std::vector<Ref<XQueryQuantifiedExprItem>>;
+
+  [[nodiscard]] static Ref<XQueryQuantifiedExpr> someExpr(Items items, Ref<XQueryExpr> satisfies);
+  [[nodiscard]] static Ref<XQueryQuantifiedExpr> everyExpr(Items items, Ref<XQueryExpr> satisfies);
+
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  // One of the shared truth values, or the error record of a binding of the wrong type.
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryQuantifiedExpr(Items items, Ref<XQueryExpr> satisfies, bool every);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  // The misspelling belongs to the name.
+  Value evaluatePostion(size_t index, XQueryContext& withContext) const;
+  Value evaluateItems(size_t clause, size_t index, XQueryContext& context) const;
+
+  Items _items;
+  Ref<XQueryExpr> _satisfies;
+  bool _every;
+};
+
+}  // namespace xquery

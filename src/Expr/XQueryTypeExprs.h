@@ -1,0 +1,82 @@
+// instance of, treat as, cast as, castable as.
+#pragma once
+
+#include "Expr/XQueryExpr.h"
+#include "Expr/XQueryTypeDeclaration.h"
+
+#include <utility>
+
+namespace xquery {
+
+// An operand and a declared type.
+class XQueryTypedExpr : public XQueryExpr {
+ public:
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+
+ protected:
+  // A null operand is the empty sequence.
+  XQueryTypedExpr(Ref<XQueryExpr> expr, Ref<XQueryTypeDeclaration> type)
+      : XQueryExpr(Kind::OtherExpr), _expr(std::move(expr)), _type(std::move(type)) {}
+  Value operand(XQueryContext& context) const;
+
+  Ref<XQueryExpr> _expr;
+  Ref<XQueryTypeDeclaration> _type;
+};
+
+class XQueryInstanceOfExpr : public XQueryTypedExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryInstanceOfExpr> instanceOfExpr(Ref<XQueryExpr> expr,
+                                                                Ref<XQueryTypeDeclaration> forType);
+  // One of the shared truth values. `forContext` may be null.
+  static Value object(const Value& object, const XQueryTypeDeclaration& instanceOf,
+                      XQueryContext* forContext);
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  using XQueryTypedExpr::XQueryTypedExpr;
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+};
+
+class XQueryTreatExpr : public XQueryTypedExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryTreatExpr> treatExpr(Ref<XQueryExpr> expr,
+                                                      Ref<XQueryTypeDeclaration> asType);
+  // The object itself when it matches; otherwise raises error 6 "invalid type".
+  static Value object(const Value& object, const XQueryTypeDeclaration& treatAs,
+                      XQueryContext& forContext) {
+    return XQueryTreatAs(object, treatAs, forContext);
+  }
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  using XQueryTypedExpr::XQueryTypedExpr;
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+};
+
+class XQueryCastExpr : public XQueryTypedExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryCastExpr> castExpr(Ref<XQueryExpr> expr,
+                                                    Ref<XQueryTypeDeclaration> asType);
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  using XQueryTypedExpr::XQueryTypedExpr;
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+};
+
+class XQueryCastableExpr : public XQueryTypedExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryCastableExpr> castableExpr(Ref<XQueryExpr> expr,
+                                                            Ref<XQueryTypeDeclaration> asType);
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  using XQueryTypedExpr::XQueryTypedExpr;
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+};
+
+}  // namespace xquery

@@ -1,0 +1,66 @@
+#include "Expr/XQueryTypeswitch.h"
+
+#include "Eval/StackGuard.h"
+#include "Eval/XQueryContextInternal.h"
+#include "Types/XQueryErrors.h"
+
+namespace xquery {
+
+Ref<XQueryCaseClauseExpr> XQueryCaseClauseExpr::exprWithName(Ref<NSString> name,
+                                                             Ref<XQueryTypeDeclaration> type,
+                                                             Ref<XQueryExpr> expr) {
+  return make<XQueryCaseClauseExpr>(std::move(name), std::move(type), std::move(expr));
+}
+
+void XQueryCaseClauseExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  declareVariable(prolog);
+  bindType(prolog);
+  bindExpr(prolog);
+}
+
+XQueryTypeswitchExpr::XQueryTypeswitchExpr(Ref<XQueryExpr> expr, CaseClauses caseClauses)
+    : XQueryExpr(Kind::OtherExpr), _expr(std::move(expr)), _caseClauses(std::move(caseClauses)) {}
+
+Ref<XQueryTypeswitchExpr> XQueryTypeswitchExpr::expr(Ref<XQueryExpr> expr,
+                                                     CaseClauses withCaseClauses) {
+  return make<XQueryTypeswitchExpr>(std::move(expr), std::move(withCaseClauses));
+}
+
+// The variables keep their IDs for the rest of the module: the scope is not put back.
+void XQueryTypeswitchExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  if (!XQueryCheckStack(prolog)) return;
+  if (_expr) _expr->bindInfoForProlog(prolog);
+  for (const auto& clause : _caseClauses) clause->bindInfoForProlog(prolog);
+}
+
+const XQueryCaseClauseExpr& XQueryTypeswitchExpr::clauseFor(const NSObject* value,
+                                                            XQueryContext& context) const {
+  for (size_t i = 0; i + 1 < _caseClauses.size(); ++i) {
+    const XQueryTypeDeclaration* type = _caseClauses[i]->type();
+    if (type && XQueryInstanceOf(value, *type, &context)) return *_caseClauses[i];
+  }
+  return *_caseClauses.back();
+}
+
+Value XQueryTypeswitchExpr::evaluateClause(const XQueryCaseClauseExpr& clause, const Value& value,
+                                           XQueryContext& context) const {
+  if (clause.varID() == 0) return clause.evaluateWithContext(context);
+  auto& dynamic = context._internal();
+  const Value former = dynamic.variableForID(clause.varID());
+  dynamic.setVariable(value, clause.varID());
+  Value result = clause.evaluateWithContext(context);
+  // A variable that was empty before stays bound to the operand.
+  if (former) dynamic.setVariable(former, clause.varID());
+  return result;
+}
+
+Value XQueryTypeswitchExpr::evaluateWithContext(XQueryContext& context) const {
+  XQueryCheckStack(context);
+  const Value value = XQueryEvaluateOrEmpty(_expr.get(), context);
+  if (isa<XQueryError>(value)) return value;
+  Value result = evaluateClause(clauseFor(value.get(), context), value, context);
+  if (!result) context._internal().raise(XQueryErrors::invalidType.errorAtLine(exprLine()));
+  return result;
+}
+
+}  // namespace xquery
