@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
+#include <sstream>
 #include <string>
 
 using command::books;
@@ -37,6 +39,21 @@ TEST(Readme, TheExampleReportsADocumentThatIsNotThere) {
   const Outcome outcome = command::start("xquery_embed", {"/nowhere.xml"});
   EXPECT_EQ(outcome.status, 3);
   EXPECT_NE(outcome.err.find("/nowhere.xml: "), std::string::npos);
+}
+
+// Every line of the README that starts the built command, run by a shell in the project's folder.
+TEST(Readme, ItsCommandLinesSucceed) {
+  std::istringstream readme(readFile(XQUERY_SOURCE_DIR "/README.md"));
+  const std::string command = "build/release/xquery ";
+  int lines = 0;
+  for (std::string line; std::getline(readme, line);) {
+    if (line.rfind(command, 0) != 0) continue;
+    const std::string script = "cd '" XQUERY_SOURCE_DIR "' && '" XQUERY_BINARY_DIR "/xquery' " +
+                               line.substr(command.size()) + " > /dev/null";
+    EXPECT_EQ(std::system(script.c_str()), 0) << line;
+    ++lines;
+  }
+  EXPECT_GE(lines, 3);
 }
 
 }  // namespace
