@@ -198,6 +198,8 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
   enum Flag : uint8_t {
     WideText = 1,  // the node's own text is UTF-16
     CDATA = 2,     // a text written as a CDATA section
+    Fixed = 4,     // part of a compiled query: does not move into another tree
+    BaseURI = 8,   // the tree has a base URI on record for the node
   };
 
   explicit NSXMLNode(Kind kind) : NSObject(kind) {}
@@ -262,7 +264,9 @@ class XQUERY_EXPORT NSXMLElement : public NSXMLNode {
   // A declaration of a prefix already declared here is not added.
   bool addNamespace(const Ref<NSXMLNode>& node);
   void removeAttributeForName(NSStringView name);
-  // The child must have no parent and must not be an ancestor. Index past the end appends.
+  // The child must have no parent and must not be an ancestor. Index past the end appends. A
+  // comment that stands in a query as it is, and so may be the result of many evaluations, is not
+  // added: add a copy of it. Answer: whether it was added.
   bool addChild(const Ref<NSXMLNode>& child);
   bool insertChild(const Ref<NSXMLNode>& child, uint32_t atIndex);
 
@@ -303,6 +307,7 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
   // The document's own URI; null when none was set.
   Ref<NSString> documentURI() const;
   void setURI(const Ref<NSString>& URI);
+  // As an element's.
   bool addChild(const Ref<NSXMLNode>& child);
   bool insertChild(const Ref<NSXMLNode>& child, uint32_t atIndex);
 

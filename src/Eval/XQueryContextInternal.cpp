@@ -1,9 +1,12 @@
 #include "Eval/XQueryContextInternal.h"
 
 #include "Platform/NSLog.h"
+#include "Platform/XMLTree.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "xquery/Collection.h"
+
+#include <atomic>
 
 namespace xquery {
 
@@ -12,7 +15,17 @@ bool XQueryIsLimit(const XQueryError* error) {
          error->msg()->view().startsWith(NSStringView::ascii("limit: "));
 }
 
-XQueryContextInternal::XQueryContextInternal() : _variables(std::make_shared<XQueryFrame>()) {}
+namespace {
+
+uint64_t nextBaseURIOwner() {
+  static std::atomic<uint64_t> last = 0;
+  return ++last;
+}
+
+}  // namespace
+
+XQueryContextInternal::XQueryContextInternal()
+    : _variables(std::make_shared<XQueryFrame>()), _baseURIOwner(nextBaseURIOwner()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;
 
@@ -90,6 +103,15 @@ Ref<NSString> XQueryContextInternal::firstPrefixForNamespace(const Ref<NSString>
   return dyn_cast<NSString>(prefixes);
 }
 
+const NSXMLNode* XQueryContextInternal::inScopeNamespaceForPrefix(NSStringView prefix) const {
+  for (auto entry = _inScopeNamespaces.rbegin(); entry != _inScopeNamespaces.rend(); ++entry) {
+    for (const auto& node : *entry) {
+      if (node->nameView() == prefix) return node.get();
+    }
+  }
+  return nullptr;
+}
+
 Ref<NSString> XQueryContextInternal::contextNamespaceForPrefix(NSStringView prefix) const {
   const auto found = _contextNamespaces.find(prefix.utf8());
   return found == _contextNamespaces.end() ? Ref<NSString>() : found->second;
@@ -103,16 +125,21 @@ void XQueryContextInternal::addNamespace(const Ref<NSString>& URI, const Ref<NSS
   }
 }
 
+// One copy serves all nodes that are recorded with the same URI in a row.
 void XQueryContextInternal::setBaseURI(const Ref<NSString>& URI, const NSXMLNode* forNode) {
-  if (URI && forNode) _baseURINodes[forNode] = URI;
+  if (!URI || !forNode) return;
+  if (!(_givenBaseURI == URI)) {
+    _recordedBaseURI = NSString::stringWithView(URI->view());
+    _givenBaseURI = URI;
+  }
+  if (NSXMLTree::recordBaseURI(forNode, _baseURIOwner, _recordedBaseURI)) ++_baseURINodeCount;
 }
 
 Ref<NSString> XQueryContextInternal::baseURIForNode(const NSXMLNode* node) const {
   if (!node) return {};
   Ref<NSString> own = XQueryNodeBaseURI(node);
-  if ((own && own->length() > 0) || _baseURINodes.empty()) return own;
-  const auto found = _baseURINodes.find(node);
-  return found == _baseURINodes.end() ? Ref<NSString>() : found->second;
+  if ((own && own->length() > 0) || _baseURINodeCount == 0) return own;
+  return NSXMLTree::recordedBaseURI(node, _baseURIOwner);
 }
 
 void XQueryContextInternal::setError(Ref<XQueryError> error, bool raiseException) {

@@ -71,15 +71,18 @@ class XQueryContextInternal {
   // The innermost constructor's prefix for the URI, else the last of the active prolog's prefixes;
   // null when there is none.
   Ref<NSString> firstPrefixForNamespace(const Ref<NSString>& URI) const;
+  // The innermost constructor's declaration of the prefix; null when none declares it.
+  const NSXMLNode* inScopeNamespaceForPrefix(NSStringView prefix) const;
   Ref<NSString> contextNamespaceForPrefix(NSStringView prefix) const;
   // A null URI removes the prefix.
   void addNamespace(const Ref<NSString>& URI, const Ref<NSString>& forPrefix);
 
   // --- base URIs of constructed nodes ------------------------------------------------------------
-  // Does nothing when either is null.
+  // Does nothing when either is null. The record is kept by the node's tree and dies with it.
   void setBaseURI(const Ref<NSString>& URI, const NSXMLNode* forNode);
   Ref<NSString> baseURIForNode(const NSXMLNode* node) const;
-  size_t baseURINodeCount() const { return _baseURINodes.size(); }
+  // How many nodes have ever been recorded, those that are gone included.
+  size_t baseURINodeCount() const { return _baseURINodeCount; }
 
   // --- errors ----------------------------------------------------------------------------------
   const Ref<XQueryError>& error() const { return _error; }
@@ -99,7 +102,11 @@ class XQueryContextInternal {
  private:
   XQueryFrameRef _variables;
   std::vector<std::vector<Ref<NSXMLNode>>> _inScopeNamespaces;
-  std::unordered_map<const NSXMLNode*, Ref<NSString>> _baseURINodes;
+  const uint64_t _baseURIOwner;  // this context's number among those that record base URIs
+  size_t _baseURINodeCount = 0;
+  // The URI given last, and a copy of it that refers to no tree.
+  Ref<NSString> _givenBaseURI;
+  Ref<NSString> _recordedBaseURI;
   std::unordered_map<Ref<XQueryQName>, Value, XQueryQNameHash, XQueryQNameEqual> _globals;
   std::map<std::string, Ref<NSString>> _contextNamespaces;
   Ref<XQueryError> _error;

@@ -29,6 +29,7 @@ class XQueryElementContentString : public NSCounted {
   void addWhiteSpace(char16_t unit) { _string.append(unit); }
 
   Ref<NSString> string() const { return _string.string(); }
+  NSStringView view() const { return _string.view(); }
   bool isXMLSpace() const { return _isXMLSpace; }
 
  protected:

@@ -1,14 +1,16 @@
+#include "Expr/XQueryAttributeExpr.h"
 #include "Expr/XQueryElementContentString.h"
+#include "Expr/XQueryElementExpr.h"
+#include "Expr/XQueryNodeExprs.h"
 #include "Parser/BuilderSupport.h"
 #include "Parser/ParserText.h"
+#include "Parser/XQueryTokens.h"
+#include "Platform/XMLTree.h"
+#include "Types/XQueryErrors.h"
+#include "Types/XQueryNodeFunctions.h"
 
 namespace xquery {
 namespace {
-
-constexpr const char* elements = "element constructors";
-constexpr const char* attributes = "attribute constructors";
-constexpr const char* comments = "comment constructors";
-constexpr const char* instructions = "processing-instruction constructors";
 
 // The last object of a list when it is a T, else null.
 template <class T>
@@ -17,10 +19,49 @@ T* lastOf(NSObject* list) {
   return objects.empty() ? nullptr : dyn_cast<T>(objects.back().get());
 }
 
+// The text of a comment, processing instruction or CDATA section, which may be missing.
+Ref<NSString> textOf(NSObject* chars) {
+  return chars ? cast<XQueryParserText>(chars)->string() : NSString::empty();
+}
+
+// Runs of characters stand in a list among expressions; each becomes a literal.
+template <class Run, class LiteralValue>
+std::vector<Ref<XQueryExpr>> expressions(NSObject* list, LiteralValue literalValue) {
+  std::vector<Ref<XQueryExpr>> result;
+  if (!list) return result;
+  for (const Value& item : cast<NSArray>(list)->objects()) {
+    if (Run* run = dyn_cast<Run>(item)) {
+      result.push_back(XQueryLiteral::literalWithValue(literalValue(run)));
+    } else {
+      result.push_back(XQRef<XQueryExpr>(item.get()));
+    }
+  }
+  return result;
+}
+
+// A literal that every evaluation answers: its node must stay what it is, whoever uses it.
+NSObject* XQNodeLiteral(const Ref<NSXMLNode>& node, int64_t line) {
+  NSXMLTree::setFixed(node.get());
+  return XQAtLine(XQueryLiteral::literalWithValue(node), line);
+}
+
+// "xmlns" or "xmlns:prefix": a declaration, of which only the first part of the value counts.
+Ref<XQueryExpr> namespaceDeclaration(const Ref<NSString>& prefix,
+                                     const std::vector<Ref<XQueryExpr>>& items) {
+  Ref<XQueryExpr> value =
+      items.empty() ? XQueryLiteral::literalWithValue(NSString::empty()) : items.front();
+  return XQueryNamespaceExpr::namespaceExprWithName(prefix, value);
+}
+
 }  // namespace
 
-NSObject* XQElementConstructor(NSObject*, NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(elements, line);
+NSObject* XQElementConstructor(NSObject* name, NSObject* attributes, NSObject* content,
+                               int64_t line) {
+  auto items = expressions<XQueryElementContentString>(
+      content, [](XQueryElementContentString* run) { return Value(run); });
+  return XQAtLine(XQueryElementExpr::elementeExprWithName(
+                      XQRef<NSString>(name), XQVector<XQueryExpr>(attributes), std::move(items)),
+                  line);
 }
 
 NSObject* XQAttributeList(NSObject* item) {
@@ -31,8 +72,19 @@ NSObject* XQAttributeListAdd(NSObject* list, NSObject* item) {
   return XQListAdd(list, item);
 }
 
-NSObject* XQAttributeListItem(NSObject*, NSObject*, int, int64_t line) {
-  return XQUnavailable(elements, line);
+NSObject* XQAttributeListItem(NSObject* name, NSObject* items, int quoteToken, int64_t line) {
+  const auto values = expressions<XQueryParserText>(
+      items, [](XQueryParserText* text) { return Value(text->string()); });
+  const Ref<NSString> attributeName = XQRef<NSString>(name);
+  const NSStringView text = attributeName->view();
+  const NSStringView declaration = NSStringView::ascii("xmlns:");
+  if (text == "xmlns") return XQAtLine(namespaceDeclaration(NSString::empty(), values), line);
+  if (text.startsWith(declaration)) {
+    const auto prefix = NSString::stringWithView(text.substring(declaration.length()));
+    return XQAtLine(namespaceDeclaration(prefix, values), line);
+  }
+  const char16_t quote = quoteToken == kTokenApos ? u'\'' : u'"';
+  return XQAtLine(XQueryAttributeExpr::attributeExprWithName(attributeName, values, quote), line);
 }
 
 NSObject* XQAttributeValueCharsWithUnicode(char16_t unit) {
@@ -98,44 +150,55 @@ NSObject* XQCharsAdd(NSObject* text, char16_t unit) {
   return text;
 }
 
-NSObject* XQCdataSection(NSObject*, int64_t line) {
-  return XQUnavailable("CDATA sections", line);
+NSObject* XQCdataSection(NSObject* text, int64_t line) {
+  return XQNodeLiteral(XQueryXMLNodeCDATA(*textOf(text)), line);
 }
 
-NSObject* XQXmlComment(NSObject*, int64_t line) {
-  return XQUnavailable(comments, line);
+NSObject* XQXmlComment(NSObject* text, int64_t line) {
+  if (const auto comment = XQueryXMLNodeComment(*textOf(text))) return XQNodeLiteral(comment, line);
+  return XQAtLine(XQueryLiteral::literalWithValue(XQueryErrors::invalidComment.errorAtLine(line)),
+                  line);
 }
 
-NSObject* XQXmlPI(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(instructions, line);
+NSObject* XQXmlPI(NSObject* target, NSObject* content, int64_t line) {
+  NSObject* name = target ? target : NSString::empty().get();
+  auto value = XQueryLiteral::literalWithValue(textOf(content));
+  return XQComputedPI(XQStringLiteral(name, line), XQueryParserAutoRelease(std::move(value)), line);
 }
 
-NSObject* XQCompDocConstructor(NSObject*, int64_t line) {
-  return XQUnavailable("document constructors", line);
+NSObject* XQCompDocConstructor(NSObject* expr, int64_t line) {
+  return XQAtLine(XQueryDocumentExpr::documentWithExpr(XQRef<XQueryExpr>(expr)), line);
 }
 
-NSObject* XQCompElemConstructor(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(elements, line);
+NSObject* XQCompElemConstructor(NSObject* name, NSObject* content, int64_t line) {
+  return XQAtLine(
+      XQueryElementExpr::elementExprWithNameExpr(Value(name), XQRef<XQueryExpr>(content)), line);
 }
 
-NSObject* XQCompAttrConsructor(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(attributes, line);
+NSObject* XQCompAttrConsructor(NSObject* name, NSObject* value, int64_t line) {
+  return XQAtLine(XQueryComputedAttributeExpr::computedAttributeExprWithName(
+                      XQRef<XQueryExpr>(name), XQRef<XQueryExpr>(value)),
+                  line);
 }
 
-NSObject* XQComputedPI(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable(instructions, line);
+NSObject* XQComputedPI(NSObject* name, NSObject* value, int64_t line) {
+  return XQAtLine(XQueryProcessingInstructionExpr::processingInstructionExprWithName(
+                      XQRef<XQueryExpr>(name), XQRef<XQueryExpr>(value)),
+                  line);
 }
 
-NSObject* XQComputedXmlComment(NSObject*, int64_t line) {
-  return XQUnavailable(comments, line);
+NSObject* XQComputedXmlComment(NSObject* value, int64_t line) {
+  return XQAtLine(XQueryCommentExpr::commentExprWithValue(XQRef<XQueryExpr>(value)), line);
 }
 
-NSObject* XQCompTextConstructor(NSObject*, int64_t line) {
-  return XQUnavailable("text constructors", line);
+NSObject* XQCompTextConstructor(NSObject* value, int64_t line) {
+  return XQAtLine(XQueryTextExpr::textExprWithValue(XQRef<XQueryExpr>(value)), line);
 }
 
-NSObject* XQCompNSConstructor(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable("namespace constructors", line);
+NSObject* XQCompNSConstructor(NSObject* prefix, NSObject* URI, int64_t line) {
+  return XQAtLine(
+      XQueryNamespaceExpr::namespaceExprWithName(XQRef<NSString>(prefix), XQRef<XQueryExpr>(URI)),
+      line);
 }
 
 }  // namespace xquery

@@ -7,6 +7,7 @@
 
 #include "xquery/XMLNode.h"
 
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -37,6 +38,33 @@ void NSXMLRetainName(const NSXMLName* name);
 void NSXMLRetainName(const NSXMLExpandedName* name);
 void NSXMLReleaseName(const NSXMLName* name);
 void NSXMLReleaseName(const NSXMLExpandedName* name);
+
+// A count of a qualified name, or null.
+class NSXMLNameRef {
+ public:
+  NSXMLNameRef() = default;
+  NSXMLNameRef(NSStringView qualifiedName, NSStringView URI)
+      : _name(NSXMLInternName(qualifiedName, URI)) {}
+  NSXMLNameRef(const NSXMLNameRef& other) : _name(other._name) {
+    if (_name) NSXMLRetainName(_name);
+  }
+  NSXMLNameRef(NSXMLNameRef&& other) noexcept : _name(std::exchange(other._name, nullptr)) {}
+  NSXMLNameRef& operator=(NSXMLNameRef other) noexcept {
+    std::swap(_name, other._name);
+    return *this;
+  }
+  ~NSXMLNameRef() {
+    if (_name) NSXMLReleaseName(_name);
+  }
+  const NSXMLName* get() const { return _name; }
+  const NSXMLName* operator->() const { return _name; }
+  explicit operator bool() const { return _name != nullptr; }
+  // Gives up the count without releasing it.
+  const NSXMLName* detach() { return std::exchange(_name, nullptr); }
+
+ private:
+  const NSXMLName* _name = nullptr;
+};
 
 // A set of names, as a tree keeps it; the counts are the user's affair. Few names are a list that
 // is searched, more are a table of 2^n places at most half full.

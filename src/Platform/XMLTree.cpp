@@ -138,6 +138,7 @@ void NSXMLTree::destroy() {
     for (NSXMLDocument* document : present->documents) document->_URI->release();
   }
   forEachName([](const NSXMLName* name) { NSXMLReleaseName(name); });
+  freeBaseURIs();
   freeBlocks();
   const std::unique_ptr<NSXMLTreeExtra> owned(extra());
   NSCounted::operator delete(this, sizeof(NSXMLTree));
@@ -368,6 +369,20 @@ NSXMLElement* NSXMLTree::makeLoneElement(NSStringView name, NSStringView URI) {
   return element;
 }
 
+NSXMLElement* NSXMLTree::makeLoneElement(const NSXMLName* name) {
+  NSXMLTree* tree = create();
+  NSXMLElement* element = tree->makeElement();
+  tree->setName(element, name);
+  return element;
+}
+
+NSXMLNode* NSXMLTree::makeLoneAttribute(const NSXMLName* name, NSStringView text) {
+  NSXMLTree* tree = create();
+  NSXMLNode* attribute = tree->makeNode(Kind::Attribute, text);
+  tree->setName(attribute, name);
+  return attribute;
+}
+
 // --- merging ---------------------------------------------------------------------------------
 
 void NSXMLTree::merge(NSXMLTree* a, NSXMLTree* b) {
@@ -378,6 +393,7 @@ void NSXMLTree::merge(NSXMLTree* a, NSXMLTree* b) {
 
 void NSXMLTree::absorb(NSXMLTree* smaller) {
   absorbExtra(smaller);
+  absorbBaseURIs(smaller);
   NSXMLBlock* block = smaller->_lastBlock;
   do {
     block->tree = this;
@@ -432,7 +448,8 @@ void prepareToJoin(NSXMLTree* parents, NSXMLTree* childs) {
 }  // namespace
 
 bool NSXMLTree::adoptChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before) {
-  if (!child || child->_parent || child->isProperty() || child->kind() == Kind::Document) {
+  if (!child || child->_parent || child->isProperty() || child->kind() == Kind::Document ||
+      isFixed(child)) {
     return false;
   }
   if (of(parent) == of(child) && parent->rootNode() == child) return false;
@@ -473,6 +490,18 @@ void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property) {
   property->_parent = element;
   property->_next = *link;
   *link = property;
+}
+
+void NSXMLTree::appendAttribute(NSXMLElement* element, NSXMLNode* attribute, NSXMLNode* last) {
+  if (!last) {
+    appendProperty(element, attribute);
+    return;
+  }
+  prepareToJoin(of(element), of(attribute));
+  merge(of(element), of(attribute));
+  noteChange(element);
+  attribute->_parent = element;
+  last->_next = attribute;
 }
 
 void NSXMLTree::unlink(NSXMLNode* node) {

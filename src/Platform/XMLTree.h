@@ -1,9 +1,10 @@
 // The arena of a tree.
 //
-//   NSXMLTree (24 bytes)        block of one node           bulk node block       text block
+//   NSXMLTree (32 bytes)        block of one node           bulk node block       text block
 //     count, order, blocks        head: tree, next            head, end             head
 //     last block ---------------> node                        node node node ...    text text ...
 //     names, cursors              [its text]
+//     base URIs on record
 //
 // The blocks of a tree form a ring (the tree knows the last, whose next is the first). The head of
 // a block names the tree; a node knows how far it is from the head of its block. So merging two
@@ -39,6 +40,16 @@ class NSXMLProcessingInstruction : public NSXMLNode {
 
 struct NSXMLTreeExtra;
 
+// A base URI on record for a node. The entries of a tree are a ring: the tree knows the one found
+// or added last, and two rings are joined in constant time. Nodes are recorded in about the order
+// in which they are asked for, so the search that goes on from there is short.
+struct NSXMLBaseURI {
+  NSXMLBaseURI* next;
+  const NSXMLNode* node;
+  uint64_t owner;
+  NSString* URI;  // one reference
+};
+
 class NSXMLTree : public NSXMLTreeHead {
  public:
   static NSXMLTree* of(const NSXMLNode* node) {
@@ -67,6 +78,9 @@ class NSXMLTree : public NSXMLTreeHead {
   [[nodiscard]] static NSXMLNode* makeLoneNode(Kind kind, NSStringView text, NSStringView name,
                                                NSStringView URI = {});
   [[nodiscard]] static NSXMLElement* makeLoneElement(NSStringView name, NSStringView URI);
+  // The tree takes over one count of the name.
+  [[nodiscard]] static NSXMLElement* makeLoneElement(const NSXMLName* name);
+  [[nodiscard]] static NSXMLNode* makeLoneAttribute(const NSXMLName* name, NSStringView text);
 
   // --- names and texts -------------------------------------------------------------------------
   // The tree takes over one count of the name.
@@ -95,6 +109,13 @@ class NSXMLTree : public NSXMLTreeHead {
   static void setStoredText(NSXMLNode* node, NSStringView text);
   void setURI(NSXMLDocument* document, const NSString* URI);  // null for none
 
+  // --- base URIs on record (XMLBaseURIs.cpp) ---------------------------------------------------
+  // Each owner has a URI of its own for a node; what it recorded goes with the tree, whether the
+  // owner is still there or not. Numbers of owners are never used again. The URI must not refer to
+  // text of a tree. Answer: whether the owner had none for the node.
+  static bool recordBaseURI(const NSXMLNode* node, uint64_t owner, const Ref<NSString>& URI);
+  static NSString* recordedBaseURI(const NSXMLNode* node, uint64_t owner);  // null for none
+
   // --- structure -------------------------------------------------------------------------------
   // Links what may become a child of `parent`: a parentless node that is neither a document nor an
   // attribute nor a namespace nor the root above `parent`. Answer: whether it did.
@@ -103,6 +124,8 @@ class NSXMLTree : public NSXMLTreeHead {
   // Links a parentless node, moving its tree into this one. `before` is null to append.
   static void insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before);
   static void appendProperty(NSXMLElement* element, NSXMLNode* property);
+  // For an element's many attributes in turn: `last` is its last one, null for none.
+  static void appendAttribute(NSXMLElement* element, NSXMLNode* attribute, NSXMLNode* last);
   static void detach(NSXMLNode* node);
   // For builders: the fields of a node, as they are.
   static NSXMLNode*& parentOf(NSXMLNode* node) { return node->_parent; }
@@ -124,6 +147,9 @@ class NSXMLTree : public NSXMLTreeHead {
   static void setOrderNumber(NSXMLNode* node, uint32_t number) { node->_word = number; }
   static void setCDATA(NSXMLNode* node) { node->_flags |= NSXMLNode::CDATA; }
   static bool isCDATA(const NSXMLNode* node) { return (node->_flags & NSXMLNode::CDATA) != 0; }
+  // A fixed node is never adopted: several threads may be using it.
+  static void setFixed(NSXMLNode* node) { node->_flags |= NSXMLNode::Fixed; }
+  static bool isFixed(const NSXMLNode* node) { return (node->_flags & NSXMLNode::Fixed) != 0; }
 
   // The number of a root whose subtree's numbers are good, as they are assigned; and of a root
   // whose subtree's numbers are not good, where the tree has several roots.
@@ -152,6 +178,8 @@ class NSXMLTree : public NSXMLTreeHead {
   static void merge(NSXMLTree* a, NSXMLTree* b);
   void absorb(NSXMLTree* smaller);
   void absorbExtra(NSXMLTree* smaller);
+  void absorbBaseURIs(NSXMLTree* smaller);
+  void freeBaseURIs();
   // Before the structure under `parent` changes.
   static void noteChange(const NSXMLNode* parent);
   static void unlink(NSXMLNode* node);
@@ -162,8 +190,9 @@ class NSXMLTree : public NSXMLTreeHead {
   NSXMLBlock* _lastBlock = nullptr;
   // 0, or the only name of the tree with the low bit set, or an NSXMLTreeExtra.
   uintptr_t _extra = 0;
+  NSXMLBaseURI* _baseURIs = nullptr;
 };
 
-static_assert(sizeof(NSXMLTree) == 24);
+static_assert(sizeof(NSXMLTree) == 32 && sizeof(NSXMLBaseURI) == 32);
 
 }  // namespace xquery

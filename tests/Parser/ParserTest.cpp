@@ -237,14 +237,14 @@ TEST(Parser, AnUnknownSetterFlagIsIgnored) {
 // --- what cannot be compiled ---------------------------------------------------------------------
 
 TEST(Parser, OneConstructThatCannotBeCompiledIsReported) {
-  EXPECT_EQ(errorsOf("1,\n2,\n<a b='{1}'>{2}</a>,\n<c/>"),
-            Strings{"XQueryError:0 - \"element constructors are not available in this build\" "
+  EXPECT_EQ(errorsOf("1,\n2,\nf(1, g(2)),\nh()"),
+            Strings{"XQueryError:0 - \"function calls are not available in this build\" "
                     "at line:3"});
 }
 
 TEST(Parser, TheConstructOnTheLowestLineIsReported) {
-  EXPECT_EQ(errorsOf("<a>{\n<?b?>\n}</a>"),
-            Strings{"XQueryError:0 - \"element constructors are not available in this build\" "
+  EXPECT_EQ(errorsOf("f(\ng()\n)"),
+            Strings{"XQueryError:0 - \"function calls are not available in this build\" "
                     "at line:1"});
 }
 

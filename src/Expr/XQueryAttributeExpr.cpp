@@ -1,0 +1,73 @@
+#include "Expr/XQueryAttributeExpr.h"
+
+#include "Eval/StackGuard.h"
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryContentText.h"
+#include "Platform/XMLTree.h"
+#include "Prolog/XQueryModules.h"
+#include "Types/XQueryErrors.h"
+#include "Types/XQueryStringFunctions.h"
+
+namespace xquery {
+namespace {
+
+bool isDeclarationName(const NSXMLName& name) {
+  static const Ref<NSString> reserved = XQueryModules::builtinNamespaceForID(XQueryNamespaceXmlns);
+  return name.text == "xmlns" || NSXMLURIOf(*name.expanded) == reserved->view();
+}
+
+NSXMLNameRef attributeName(const XQueryConstructorName& expr, XQueryContext& context,
+                           int64_t line) {
+  NSXMLNameRef name = expr.evaluate(context, line);
+  if (isDeclarationName(*name.get())) {
+    context._internal().raise(XQueryErrors::attributeIsXMLNS.errorAtLine(line));
+  }
+  return name;
+}
+
+Value attribute(NSXMLNameRef name, NSMutableString& text) {
+  XQueryNormalizeAttributeString(text);
+  return Ref<NSXMLNode>(NSXMLTree::makeLoneAttribute(name.detach(), text.view()));
+}
+
+}  // namespace
+
+Ref<XQueryAttributeExpr> XQueryAttributeExpr::attributeExprWithName(
+    const Ref<NSString>& name, std::vector<Ref<XQueryExpr>> forItems, char16_t enclosedWith) {
+  return make<XQueryAttributeExpr>(name, std::move(forItems), enclosedWith);
+}
+
+void XQueryAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  _name.bind(prolog, Kind::Attribute, exprLine());
+  for (const auto& item : _items) item->bindInfoForProlog(prolog);
+}
+
+Value XQueryAttributeExpr::evaluateWithContext(XQueryContext& context) const {
+  NSXMLNameRef name = attributeName(_name, context, exprLine());
+  NSMutableString text;
+  for (const auto& item : _items) {
+    XQueryAppendText(item->evaluateWithContext(context), text, context);
+  }
+  return attribute(std::move(name), text);
+}
+
+Ref<XQueryComputedAttributeExpr> XQueryComputedAttributeExpr::computedAttributeExprWithName(
+    Ref<XQueryExpr> name, Ref<XQueryExpr> value) {
+  return make<XQueryComputedAttributeExpr>(std::move(name), std::move(value));
+}
+
+void XQueryComputedAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  if (!XQueryCheckStack(prolog)) return;
+  _name.bind(prolog, Kind::Attribute, exprLine());
+  if (_value) _value->bindInfoForProlog(prolog);
+}
+
+Value XQueryComputedAttributeExpr::evaluateWithContext(XQueryContext& context) const {
+  XQueryCheckStack(context);
+  NSXMLNameRef name = attributeName(_name, context, exprLine());
+  NSMutableString text;
+  if (_value) XQueryAppendText(_value->evaluateWithContext(context), text, context);
+  return attribute(std::move(name), text);
+}
+
+}  // namespace xquery

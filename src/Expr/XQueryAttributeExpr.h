@@ -1,0 +1,58 @@
+// Attribute constructors.
+#pragma once
+
+#include "Expr/XQueryConstructorName.h"
+#include "Expr/XQueryExpr.h"
+#include "xquery/XMLNode.h"
+
+#include <vector>
+
+namespace xquery {
+
+// An attribute of a direct constructor.
+class XQueryAttributeExpr : public XQueryExpr {
+ public:
+  // The parts of the value are literals and enclosed expressions; `quoteChar` is the delimiter in
+  // the query, 34 or 39.
+  [[nodiscard]] static Ref<XQueryAttributeExpr> attributeExprWithName(
+      const Ref<NSString>& name, std::vector<Ref<XQueryExpr>> forItems, char16_t enclosedWith);
+
+  char16_t quoteChar() const { return _quoteChar; }
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryAttributeExpr(const Ref<NSString>& name, std::vector<Ref<XQueryExpr>> items,
+                      char16_t quoteChar)
+      : XQueryExpr(Kind::OtherExpr), _name(name), _items(std::move(items)), _quoteChar(quoteChar) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  XQueryConstructorName _name;
+  std::vector<Ref<XQueryExpr>> _items;
+  char16_t _quoteChar;
+};
+
+// attribute {...} {...}
+class XQueryComputedAttributeExpr : public XQueryExpr {
+ public:
+  // `value` may be null.
+  [[nodiscard]] static Ref<XQueryComputedAttributeExpr> computedAttributeExprWithName(
+      Ref<XQueryExpr> name, Ref<XQueryExpr> value);
+
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryComputedAttributeExpr(Ref<XQueryExpr> name, Ref<XQueryExpr> value)
+      : XQueryExpr(Kind::OtherExpr), _name(std::move(name)), _value(std::move(value)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  XQueryConstructorName _name;
+  Ref<XQueryExpr> _value;
+};
+
+}  // namespace xquery

@@ -1,0 +1,91 @@
+#include "Expr/XQueryConstructorName.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryLeaves.h"
+#include "Prolog/XQueryProlog.h"
+#include "Types/XQueryAtomization.h"
+#include "Types/XQueryCasting.h"
+#include "Types/XQueryErrors.h"
+
+namespace xquery {
+namespace {
+
+NSXMLNameRef nodeName(const XQueryQName& name) {
+  const Ref<NSString>& URI = name.namespaceURI();
+  return {name.XQueryStringValue()->view(), URI ? URI->view() : NSStringView()};
+}
+
+bool hasPrefix(NSStringView name) {
+  const uint32_t colon = name.find(u':');
+  return colon != NSStringView::notFound && colon != 0;
+}
+
+}  // namespace
+
+XQueryConstructorName::XQueryConstructorName(const Value& nameOrExpr) {
+  if (isa<NSString>(nameOrExpr)) {
+    _name = cast<NSString>(nameOrExpr);
+  } else {
+    _nameExpr = cast<XQueryExpr>(nameOrExpr);
+  }
+}
+
+// Null when the prefix stands for no namespace; one that is declared as "" does not stand for any.
+Ref<XQueryQName> XQueryConstructorName::resolved(const XQueryProlog& prolog, Kind nodeKind) const {
+  if (!hasPrefix(_name->view())) {
+    if (nodeKind == Kind::Attribute) return XQueryQName::qname(_name, nullptr);
+    bool fromProlog = false;
+    const Ref<NSString> URI = prolog.namespaceForPrefix(NSStringView(), fromProlog);
+    if (!fromProlog) return XQueryQName::qname(_name, URI->length() ? URI : nullptr);
+    return prolog.xmlQNameFromString(_name);
+  }
+  Ref<XQueryQName> qName = prolog.xmlQNameFromString(_name);
+  return qName && qName->namespaceURI()->length() ? qName : nullptr;
+}
+
+void XQueryConstructorName::bindUnresolved(XQueryProlog& prolog, int64_t line) {
+  if (prolog.isModule()) {
+    auto error = XQueryErrors::unresolvedQName.errorAtLine(line, _name);
+    prolog.addError(error);
+    _nameExpr = XQueryLiteral::literalWithValue(error);
+    return;
+  }
+  auto reference = XQueryQNameReference::qNameReferenceWithString(_name, line);
+  prolog.addQNameReference(reference);
+  _nameExpr = reference;
+  if (hasPrefix(_name->view())) return;
+  _constant = NSXMLNameRef(_name->view(), NSStringView());
+  _waitsForContext = true;
+}
+
+void XQueryConstructorName::bind(XQueryProlog& prolog, Kind nodeKind, int64_t line) {
+  if (_nameExpr || !_name) {
+    if (_nameExpr) _nameExpr->bindInfoForProlog(prolog);
+  } else if (const Ref<XQueryQName> qName = resolved(prolog, nodeKind)) {
+    _nameExpr = XQueryQNameReference::qNameReferenceWithQName(qName, line);
+    _constant = nodeName(*qName);
+  } else {
+    bindUnresolved(prolog, line);
+  }
+}
+
+bool XQueryConstructorName::isConstantIn(XQueryContext& context) const {
+  return _constant &&
+         (!_waitsForContext || !context._internal().contextNamespaceForPrefix(NSStringView()));
+}
+
+NSXMLNameRef XQueryConstructorName::evaluate(XQueryContext& context, int64_t line) const {
+  if (isConstantIn(context)) return _constant;
+  const Value value = _nameExpr ? _nameExpr->evaluateWithContext(context) : Value();
+  if (!value) {
+    context._internal().raise(XQueryErrors::unresolvedQName.errorAtLine(line, _name));
+  }
+  const Value item =
+      XQueryAtomizationCheckingOccurrence(value, XQueryOccurrenceExactlyOne, context);
+  const Value name = XQueryCastAs(item, XQueryTypeQName, context);
+  const auto* qName = dyn_cast<XQueryQName>(name);
+  if (!qName) context._internal().raise(XQueryErrors::invalidType.errorAtLine(line));
+  return nodeName(*qName);
+}
+
+}  // namespace xquery

@@ -1,0 +1,159 @@
+#include "Expr/XQueryContent.h"
+
+#include "Eval/StackGuard.h"
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryContentText.h"
+#include "Expr/XQueryElementContentString.h"
+#include "Expr/XQueryInScopeNamespaces.h"
+#include "Platform/XMLTree.h"
+#include "Prolog/XQueryProlog.h"
+#include "Types/XQueryAtomization.h"
+#include "Types/XQueryErrors.h"
+#include "xquery/Collection.h"
+
+namespace xquery {
+
+// --- items ---------------------------------------------------------------------------------------
+
+void XQueryContent::add(const Value& value) {
+  _previousWasAtomic = false;
+  addItem(value.get());
+}
+
+void XQueryContent::addItems(const std::vector<Value>& items) {
+  XQueryCheckStack(_context);
+  for (const Value& item : items) addItem(item.get());
+}
+
+void XQueryContent::addItem(NSObject* item) {
+  if (!item || item->kind() == Kind::Null) return;
+  if (const auto* items = dyn_cast<NSArray>(item)) {
+    addItems(items->objects());
+    return;
+  }
+  const bool followsAtomic = std::exchange(_previousWasAtomic, false);
+  if (auto* node = dyn_cast<NSXMLNode>(item)) {
+    addNode(*node);
+  } else if (const auto* run = dyn_cast<XQueryElementContentString>(item)) {
+    if (run->isXMLSpace() && !_context._internal().xmlSpacePreserve()) return;
+    appendText(run->view());
+    noteContent();
+  } else if (auto* error = dyn_cast<XQueryError>(item)) {
+    _context._internal().raise(error);
+  } else if (XQueryIsAtomicType(item)) {
+    if (followsAtomic) _text.append(u' ');
+    XQueryAppendAtomic(item, _text, _context);
+    _previousWasAtomic = true;
+    noteContent();
+  } else {
+    noteContent();
+  }
+}
+
+void XQueryContent::addNode(NSXMLNode& node) {
+  switch (node.kind()) {
+    case Kind::Attribute:
+      addAttribute(node);
+      return;
+    case Kind::Namespace:
+      addNamespace(node);
+      return;
+    case Kind::Document:
+      for (NSXMLNode* child = node.firstChild(); child; child = child->nextSibling()) {
+        addNode(*child);
+      }
+      break;
+    case Kind::Element:
+      addElement(static_cast<NSXMLElement&>(node));
+      break;
+    case Kind::Text:
+      addText(node);
+      break;
+    default:
+      addChild(node);
+  }
+  noteContent();
+}
+
+// --- nodes ---------------------------------------------------------------------------------------
+
+void XQueryContent::flushText() {
+  if (_text.length() == 0) return;
+  insert(*NSXMLTree::of(&_parent)->makeNode(Kind::Text, _text.view()));
+  _text.clear();
+}
+
+Ref<NSXMLNode> XQueryContent::adoptable(NSXMLNode& node) {
+  return node.parent() || NSXMLTree::isFixed(&node) ? node.copy() : Ref<NSXMLNode>(&node);
+}
+
+void XQueryContent::insert(NSXMLNode& child) {
+  NSXMLTree::insertChild(&_parent, &child, nullptr);
+}
+
+void XQueryContent::addChild(NSXMLNode& node) {
+  flushText();
+  insert(*adoptable(node));
+}
+
+// --- elements ------------------------------------------------------------------------------------
+
+XQueryElementContent::XQueryElementContent(NSXMLElement& element,
+                                           XQueryInScopeNamespaces& namespaces,
+                                           XQueryContext& context, int64_t line)
+    : XQueryContent(element, context, line),
+      _namespaces(namespaces),
+      _inheritNamespaces(!context._internal().activeProlog() ||
+                         context._internal().activeProlog()->inheritNamespaces()) {}
+
+void XQueryElementContent::addElement(NSXMLElement& child) {
+  const Ref<NSXMLNode> added = adoptable(child);
+  const auto* formerParent = dyn_cast<NSXMLElement>(child.parent());
+  if (formerParent && !_inheritNamespaces) {
+    _namespaces.keepNamespaces(*cast<NSXMLElement>(added.get()), *formerParent);
+  }
+  flushText();
+  insert(*added);
+}
+
+bool XQueryElementContent::isNewName(const NSXMLNode& attribute) {
+  constexpr uint32_t few = 16;
+  const NSXMLExpandedName* name = attribute.expandedName();
+  if (_names) return _names->insert(name).second;
+  if (_attributeCount == few)
+    _names = std::make_unique<std::unordered_set<const NSXMLExpandedName*>>();
+  for (const NSXMLNode* other = element().firstAttribute(); other;
+       other = NSXMLElement::nextAttribute(other)) {
+    if (other->expandedName() == name) return false;
+    if (_names) _names->insert(other->expandedName());
+  }
+  if (_names) _names->insert(name);
+  return true;
+}
+
+// Attributes that differ in their expanded names are all kept, should their prefixes be the same.
+void XQueryElementContent::addAttribute(NSXMLNode& attribute) {
+  if (!_attributesAllowed) return;
+  if (!isNewName(attribute)) {
+    _context._internal().raise(XQueryErrors::attributeNotDistinct.errorAtLine(_line));
+  }
+  const Ref<NSXMLNode> added = adoptable(attribute);
+  _namespaces.updateNamespacesForElement(element(), *added);
+  NSXMLTree::appendAttribute(&element(), added.get(), _lastAttribute);
+  _lastAttribute = added.get();
+  ++_attributeCount;
+}
+
+// --- documents -----------------------------------------------------------------------------------
+
+void XQueryDocumentContent::refuse() {
+  _context._internal().raise(XQueryErrors::invalidDocumentNode.errorAtLine(_line));
+}
+
+void XQueryDocumentContent::addElement(NSXMLElement& element) {
+  if (_hasElement) refuse();
+  _hasElement = true;
+  addChild(element);
+}
+
+}  // namespace xquery

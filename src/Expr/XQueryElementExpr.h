@@ -1,0 +1,42 @@
+// Element constructors.
+#pragma once
+
+#include "Expr/XQueryConstructorName.h"
+#include "Expr/XQueryExpr.h"
+#include "xquery/XMLNode.h"
+
+#include <vector>
+
+namespace xquery {
+
+class XQueryElementExpr : public XQueryExpr {
+ public:
+  using Exprs = std::vector<Ref<XQueryExpr>>;
+
+  // A direct constructor. Each item of the content is evaluated on its own.
+  [[nodiscard]] static Ref<XQueryElementExpr> elementeExprWithName(const Ref<NSString>& name,
+                                                                   Exprs attributes, Exprs items);
+  // A computed constructor, of a constant name (a string) or an expression. `value` may be null.
+  [[nodiscard]] static Ref<XQueryElementExpr> elementExprWithNameExpr(const Value& nameExpr,
+                                                                      Ref<XQueryExpr> value);
+
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryElementExpr(XQueryConstructorName name, Exprs attributes, Exprs items)
+      : XQueryExpr(Kind::OtherExpr),
+        _name(std::move(name)),
+        _attributes(std::move(attributes)),
+        _items(std::move(items)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  XQueryConstructorName _name;
+  Exprs _attributes;  // attribute and namespace expressions
+  Exprs _items;
+  std::vector<Ref<NSXMLNode>> _namespaces;  // declared with literal URIs; copied into each element
+};
+
+}  // namespace xquery

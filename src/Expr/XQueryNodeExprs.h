@@ -1,0 +1,110 @@
+// Constructors of texts, comments, processing instructions, documents and namespaces.
+#pragma once
+
+#include "Expr/XQueryConstructorName.h"
+#include "Expr/XQueryExpr.h"
+#include "xquery/XMLNode.h"
+
+namespace xquery {
+
+// text {...}: the empty sequence makes no node.
+class XQueryTextExpr : public XQueryExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryTextExpr> textExprWithValue(Ref<XQueryExpr> value);
+
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  explicit XQueryTextExpr(Ref<XQueryExpr> value)
+      : XQueryExpr(Kind::OtherExpr), _value(std::move(value)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<XQueryExpr> _value;
+};
+
+// comment {...}
+class XQueryCommentExpr : public XQueryExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryCommentExpr> commentExprWithValue(Ref<XQueryExpr> value);
+
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  explicit XQueryCommentExpr(Ref<XQueryExpr> value)
+      : XQueryExpr(Kind::OtherExpr), _value(std::move(value)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<XQueryExpr> _value;
+};
+
+// processing-instruction {...} {...}, and the direct form.
+class XQueryProcessingInstructionExpr : public XQueryExpr {
+ public:
+  // `value` may be null.
+  [[nodiscard]] static Ref<XQueryProcessingInstructionExpr> processingInstructionExprWithName(
+      Ref<XQueryExpr> name, Ref<XQueryExpr> value);
+
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryProcessingInstructionExpr(Ref<XQueryExpr> name, Ref<XQueryExpr> value)
+      : XQueryExpr(Kind::OtherExpr), _name(std::move(name)), _value(std::move(value)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  XQueryConstructorName _name;
+  Ref<XQueryExpr> _value;
+};
+
+// document {...}
+class XQueryDocumentExpr : public XQueryExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryDocumentExpr> documentWithExpr(Ref<XQueryExpr> expr);
+
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  explicit XQueryDocumentExpr(Ref<XQueryExpr> expr)
+      : XQueryExpr(Kind::OtherExpr), _expr(std::move(expr)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<XQueryExpr> _expr;
+};
+
+// A namespace declaration attribute of a direct constructor.
+class XQueryNamespaceExpr : public XQueryExpr {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::NamespaceExpr; }
+
+  // The name is the prefix, "" for the default namespace.
+  [[nodiscard]] static Ref<XQueryNamespaceExpr> namespaceExprWithName(Ref<NSString> name,
+                                                                      Ref<XQueryExpr> value);
+
+  // The declaration, known without evaluation; null when the value is not a literal string.
+  Ref<NSXMLNode> constantNode() const;
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryNamespaceExpr(Ref<NSString> name, Ref<XQueryExpr> value)
+      : XQueryExpr(Kind::NamespaceExpr), _name(std::move(name)), _value(std::move(value)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  Ref<NSString> _name;
+  Ref<XQueryExpr> _value;
+};
+
+}  // namespace xquery

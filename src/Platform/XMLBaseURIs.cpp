@@ -1,0 +1,72 @@
+// Base URIs on record for nodes of a tree. They have nothing to do with "xml:base": who makes a
+// node may note the base URI that held where it was made, for as long as the node is there.
+//
+// Reading does not change the ring, only the place where the next search starts, so that several
+// threads may ask.
+#include "Platform/XMLTree.h"
+
+#include <new>
+#include <utility>
+
+namespace xquery {
+
+namespace {
+
+NSXMLBaseURI* findEntry(NSXMLBaseURI* start, const NSXMLNode* node, uint64_t owner) {
+  if (!start) return nullptr;
+  NSXMLBaseURI* entry = start;
+  do {
+    entry = entry->next;
+    if (entry->node == node && entry->owner == owner) return entry;
+  } while (entry != start);
+  return nullptr;
+}
+
+}  // namespace
+
+bool NSXMLTree::recordBaseURI(const NSXMLNode* node, uint64_t owner, const Ref<NSString>& URI) {
+  NSXMLBaseURI*& last = of(node)->_baseURIs;
+  const bool isKnown = (node->_flags & NSXMLNode::BaseURI) != 0;
+  if (NSXMLBaseURI* entry = isKnown ? findEntry(last, node, owner) : nullptr) {
+    entry->URI->release();
+    entry->URI = Ref<NSString>(URI).detach();
+    return false;
+  }
+  void* memory = NSCounted::operator new(sizeof(NSXMLBaseURI));
+  auto* entry = ::new (memory) NSXMLBaseURI{nullptr, node, owner, Ref<NSString>(URI).detach()};
+  entry->next = last ? last->next : entry;
+  if (last) last->next = entry;
+  last = entry;
+  const_cast<NSXMLNode*>(node)->_flags |= NSXMLNode::BaseURI;
+  return true;
+}
+
+NSString* NSXMLTree::recordedBaseURI(const NSXMLNode* node, uint64_t owner) {
+  if (!(node->_flags & NSXMLNode::BaseURI)) return nullptr;
+  NSXMLBaseURI** last = &of(node)->_baseURIs;
+  NSXMLBaseURI* entry = findEntry(__atomic_load_n(last, __ATOMIC_RELAXED), node, owner);
+  if (!entry) return nullptr;
+  __atomic_store_n(last, entry, __ATOMIC_RELAXED);
+  return entry->URI;
+}
+
+// Exchanging the successors of two entries of different rings makes them one.
+void NSXMLTree::absorbBaseURIs(NSXMLTree* smaller) {
+  if (_baseURIs && smaller->_baseURIs) std::swap(_baseURIs->next, smaller->_baseURIs->next);
+  if (smaller->_baseURIs) _baseURIs = smaller->_baseURIs;
+  smaller->_baseURIs = nullptr;
+}
+
+void NSXMLTree::freeBaseURIs() {
+  if (!_baseURIs) return;
+  NSXMLBaseURI* entry = _baseURIs->next;
+  _baseURIs->next = nullptr;
+  while (entry) {
+    NSXMLBaseURI* next = entry->next;
+    entry->URI->release();
+    NSCounted::operator delete(entry, sizeof(NSXMLBaseURI));
+    entry = next;
+  }
+}
+
+}  // namespace xquery
