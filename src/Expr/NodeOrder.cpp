@@ -13,7 +13,6 @@
 #include "Expr/NodeOrder.h"
 
 #include "Expr/StableMergeSort.h"
-
 #include "xquery/Number.h"
 
 #include <algorithm>
