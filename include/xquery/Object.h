@@ -69,6 +69,7 @@ enum class Kind : uint8_t {
   VarDecl,
   ParsedModule,
   ParserText,
+  URLHandle,
   PathResults,
   PathStepFirst,
   AxisStep = PathStepFirst,

@@ -4,6 +4,8 @@
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
+#include <string>
+
 namespace xquery {
 
 // As an item an xs:anyURI value.
@@ -19,16 +21,27 @@ class XQUERY_EXPORT NSURL : public NSCounted {
 
   // The text as given (for a resolved reference: the resolved text).
   const Ref<NSString>& absoluteString() const { return _text; }
+  // In lower case; empty for a relative reference.
+  std::string scheme() const;
+  // The host as written; empty when there is none.
+  std::string host() const;
+  // Escapes decoded, so that it may hold any bytes.
+  std::string path() const;
+  // The path of the reference as it was given, before it was resolved.
+  std::string relativePath() const;
   bool isEqual(const NSURL& other) const { return _text->isEqualToString(*other._text); }
   uint32_t hash() const { return _text->hash(); }
 
  protected:
-  explicit NSURL(Ref<NSString> text) : NSCounted(Kind::URL), _text(std::move(text)) {}
+  explicit NSURL(Ref<NSString> text) : NSURL(text, text) {}
+  NSURL(Ref<NSString> text, Ref<NSString> reference)
+      : NSCounted(Kind::URL), _text(std::move(text)), _reference(std::move(reference)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
   Ref<NSString> _text;
+  Ref<NSString> _reference;
 };
 
 }  // namespace xquery

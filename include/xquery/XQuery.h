@@ -9,6 +9,7 @@
 
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
+#include "xquery/Loading.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
@@ -43,6 +44,13 @@ class XQUERY_EXPORT XQuery : public NSCounted {
   [[nodiscard]] static Ref<XQuery> xqueryWithSource(const Ref<NSString>& source);
   // UTF-8 text; text that is not well-formed UTF-8 is a compile error (3, no line).
   [[nodiscard]] static Ref<XQuery> xqueryWithSource(std::string_view source);
+  // Library modules are fetched while the query is compiled, from the locations that the imports
+  // name, which are absolute URLs. `loading` says how; without it any file, http and https URL is
+  // read. A module that cannot be had is a compile error (47).
+  [[nodiscard]] static Ref<XQuery> xqueryWithSource(const Ref<NSString>& source,
+                                                    const XQueryLoading& loading);
+  [[nodiscard]] static Ref<XQuery> xqueryWithSource(std::string_view source,
+                                                    const XQueryLoading& loading);
 
   // Null when the query compiled, else a new array of one XQueryError or more in the order found:
   // those of the parser, or, when it found none, those of the prolog and of names that do not
@@ -83,7 +91,8 @@ class XQUERY_EXPORT XQueryClient {
 };
 
 // The object against which queries are evaluated. It keeps, from one evaluation to the next, its
-// client, its namespaces, its last error and its focus.
+// client, its namespaces, its loading settings, the documents it loaded, its last error and its
+// focus.
 //
 //   auto context = XQueryContext::xqueryContext();
 //   Ref<XQueryError> error;
@@ -123,6 +132,13 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   // The context shares the client with the host; null takes it away.
   void contextSetClient(std::shared_ptr<XQueryClient> client);
   std::shared_ptr<XQueryClient> contextClient() const;
+
+  // How documents, raw bodies and stylesheets are fetched from now on; at first any file, http and
+  // https URL is. A document is fetched once in the life of a context, and one that could not be
+  // had stays missing, whatever the settings are later.
+  void contextSetLoading(const XQueryLoading& loading);
+  const XQueryLoading& contextLoading() const;
+
   // Accepts its arguments and does nothing.
   void contextAddClientSelector(std::string_view selector, std::string_view forName);
 

@@ -4,6 +4,7 @@
 #include "xquery/Collection.h"
 #include "xquery/Data.h"
 #include "xquery/Error.h"
+#include "xquery/Loading.h"
 #include "xquery/Number.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"

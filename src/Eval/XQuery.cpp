@@ -17,15 +17,23 @@
 namespace xquery {
 
 Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source) {
+  return xqueryWithSource(source, XQueryLoading());
+}
+
+Ref<XQuery> XQuery::xqueryWithSource(std::string_view source) {
+  return xqueryWithSource(source, XQueryLoading());
+}
+
+Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source, const XQueryLoading& loading) {
   try {
-    return make<XQuery>(std::make_unique<XQueryInternal>(source));
+    return make<XQuery>(std::make_unique<XQueryInternal>(source, loading));
   } catch (const std::bad_alloc&) {
     return make<XQuery>(std::make_unique<XQueryInternal>(XQueryErrors::outOfMemory.error()));
   }
 }
 
-Ref<XQuery> XQuery::xqueryWithSource(std::string_view source) {
-  if (const auto text = NSString::stringWithUTF8(source)) return xqueryWithSource(text);
+Ref<XQuery> XQuery::xqueryWithSource(std::string_view source, const XQueryLoading& loading) {
+  if (const auto text = NSString::stringWithUTF8(source)) return xqueryWithSource(text, loading);
   return make<XQuery>(std::make_unique<XQueryInternal>(XQueryErrors::notUTF8.error()));
 }
 
@@ -68,6 +76,14 @@ void XQueryContext::contextSetClient(std::shared_ptr<XQueryClient> client) {
 
 std::shared_ptr<XQueryClient> XQueryContext::contextClient() const {
   return _private->client();
+}
+
+void XQueryContext::contextSetLoading(const XQueryLoading& loading) {
+  _private->setLoading(loading);
+}
+
+const XQueryLoading& XQueryContext::contextLoading() const {
+  return _private->loader().loading();
 }
 
 void XQueryContext::contextAddClientSelector(std::string_view, std::string_view) {}

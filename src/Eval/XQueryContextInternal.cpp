@@ -25,7 +25,9 @@ uint64_t nextBaseURIOwner() {
 }  // namespace
 
 XQueryContextInternal::XQueryContextInternal()
-    : _variables(std::make_shared<XQueryFrame>()), _baseURIOwner(nextBaseURIOwner()) {}
+    : _variables(std::make_shared<XQueryFrame>()),
+      _baseURIOwner(nextBaseURIOwner()),
+      _loader(NSURLLoader::loaderWithLoading()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;
 

@@ -2,6 +2,7 @@
 // error and what is kept from one evaluation to the next.
 #pragma once
 
+#include "Platform/NSURLLoader.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
@@ -84,6 +85,17 @@ class XQueryContextInternal {
   // How many nodes have ever been recorded, those that are gone included.
   size_t baseURINodeCount() const { return _baseURINodeCount; }
 
+  // --- documents and bodies
+  // ------------------------------------------------------------------------ What the URL names,
+  // parsed as XML or HTML without text of white space only; NSNull when it cannot be had. Fetched
+  // once: the first answer, a failure included, is the answer for good.
+  Value XQueryDocumentForURL(const Ref<NSURL>& URL);
+  // The raw bytes; null when they cannot be had. What was loaded as a document, or could not be,
+  // has none.
+  Ref<NSData> URLBody(const Ref<NSURL>& URL);
+  NSURLLoader& loader() const { return *_loader; }
+  void setLoading(const XQueryLoading& loading);
+
   // --- errors ----------------------------------------------------------------------------------
   const Ref<XQueryError>& error() const { return _error; }
   // Keeps the error (the last one wins) and, when asked, throws an NSException named "XQueryError"
@@ -109,6 +121,9 @@ class XQueryContextInternal {
   Ref<NSString> _recordedBaseURI;
   std::unordered_map<Ref<XQueryQName>, Value, XQueryQNameHash, XQueryQNameEqual> _globals;
   std::map<std::string, Ref<NSString>> _contextNamespaces;
+  Ref<NSURLLoader> _loader;
+  NSURLTable<Value> _documentCache;  // documents, NSNull for failures
+  NSURLTable<Ref<NSURLHandle>> _URLCache;
   Ref<XQueryError> _error;
   XQueryProlog* _prolog = nullptr;
   std::shared_ptr<XQueryClient> _client;

@@ -2,13 +2,14 @@
 
 #include "Parser/XQueryParsedModule.h"
 #include "Parser/XQueryParser.h"
+#include "Platform/NSURLLoader.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
 
 namespace xquery {
 
-XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource) {
+XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource, const XQueryLoading& loading) {
   const auto parser = XQueryParser::parserWithSource(initWithSource);
   _errors = parser->errors();
   if (!_errors.empty()) return;
@@ -21,7 +22,8 @@ XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource) {
     version = module->version();
     _body = module->body();
   }
-  _prolog = XQueryProlog::prologWithItems(items, nullptr, nullptr, version);
+  _prolog = XQueryProlog::prologWithItems(items, nullptr, nullptr, version,
+                                          NSURLLoader::loaderWithLoading(loading));
   // Local variable IDs of the main body start at 1.
   _prolog->setNextLocalVariableID(1);
   if (_body) _body->bindInfoForProlog(*_prolog);

@@ -3,6 +3,7 @@
 
 #include "Expr/XQueryExpr.h"
 #include "xquery/Error.h"
+#include "xquery/Loading.h"
 #include "xquery/String.h"
 
 #include <vector>
@@ -14,7 +15,7 @@ class XQueryProlog;
 class XQueryInternal {
  public:
   // Compiles. Parse errors leave prolog and body null.
-  explicit XQueryInternal(const Ref<NSString>& initWithSource);
+  explicit XQueryInternal(const Ref<NSString>& initWithSource, const XQueryLoading& loading = {});
   // A query that failed before it could be parsed.
   explicit XQueryInternal(Ref<XQueryError> error);
   // A query put together by hand, for the tests of the expression tree.

@@ -1,7 +1,60 @@
 #include "Platform/URIParser.h"
 #include "xquery/URL.h"
 
+#include <string_view>
+
 namespace xquery {
+
+namespace {
+
+struct Parts {
+  std::string_view scheme, authority, path;
+};
+
+// Of a text that is a URI reference.
+Parts partsOf(const NSString& reference) {
+  const NSStringView view = reference.view();
+  std::string_view rest(view.asciiUnits(), view.length());
+  rest = rest.substr(0, rest.find_first_of("?#"));
+  Parts parts;
+  // A colon after a slash belongs to the path.
+  if (const size_t end = rest.find_first_of(":/"); end != rest.npos && rest[end] == ':') {
+    parts.scheme = rest.substr(0, end);
+    rest.remove_prefix(end + 1);
+  }
+  if (rest.substr(0, 2) == "//") {
+    const size_t end = rest.find('/', 2);
+    parts.authority = rest.substr(2, end == rest.npos ? end : end - 2);
+    rest = end == rest.npos ? std::string_view() : rest.substr(end);
+  }
+  parts.path = rest;
+  return parts;
+}
+
+char lowerCase(char letter) {
+  return letter >= 'A' && letter <= 'Z' ? static_cast<char>(letter - 'A' + 'a') : letter;
+}
+
+int hexadecimalDigit(char digit) {
+  if (digit >= '0' && digit <= '9') return digit - '0';
+  return lowerCase(digit) - 'a' + 10;
+}
+
+std::string unescaped(std::string_view text) {
+  std::string out;
+  for (size_t index = 0; index < text.size(); ++index) {
+    char byte = text[index];
+    if (byte == '%' && index + 2 < text.size()) {
+      byte = static_cast<char>(hexadecimalDigit(text[index + 1]) * 16 +
+                               hexadecimalDigit(text[index + 2]));
+      index += 2;
+    }
+    out += byte;
+  }
+  return out;
+}
+
+}  // namespace
 
 Ref<NSURL> NSURL::URLWithString(const Ref<NSString>& text) {
   // Every character of a URI is ASCII.
@@ -18,7 +71,30 @@ Ref<NSURL> NSURL::URLWithString(const Ref<NSString>& text, const NSURL& base) {
   const std::optional<std::string> resolved = resolveURIReference(
       {reference.asciiUnits(), reference.length()}, {baseText.asciiUnits(), baseText.length()});
   if (!resolved) return nullptr;
-  return make<NSURL>(NSString::stringWithASCII(*resolved));
+  return make<NSURL>(NSString::stringWithASCII(*resolved), text);
+}
+
+std::string NSURL::scheme() const {
+  std::string scheme(partsOf(*_text).scheme);
+  for (char& letter : scheme) letter = lowerCase(letter);
+  return scheme;
+}
+
+std::string NSURL::host() const {
+  std::string_view host = partsOf(*_text).authority;
+  if (const size_t at = host.rfind('@'); at != host.npos) host.remove_prefix(at + 1);
+  // A colon inside brackets is part of an IPv6 address.
+  const size_t colon = host.rfind(':');
+  if (colon != host.npos && host.find(']', colon) == host.npos) host = host.substr(0, colon);
+  return std::string(host);
+}
+
+std::string NSURL::path() const {
+  return unescaped(partsOf(*_text).path);
+}
+
+std::string NSURL::relativePath() const {
+  return unescaped(partsOf(*_reference).path);
 }
 
 }  // namespace xquery

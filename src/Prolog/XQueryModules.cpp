@@ -50,12 +50,13 @@ int64_t builtinIDForNamespace(NSStringView URI) {
 
 }  // namespace
 
-XQueryModules::XQueryModules() : NSCounted(Kind::Modules) {}
+XQueryModules::XQueryModules(Ref<NSURLLoader> loader)
+    : NSCounted(Kind::Modules), _loader(std::move(loader)) {}
 
 XQueryModules::~XQueryModules() = default;
 
-Ref<XQueryModules> XQueryModules::modules() {
-  return make<XQueryModules>();
+Ref<XQueryModules> XQueryModules::modules(Ref<NSURLLoader> loader) {
+  return make<XQueryModules>(loader ? std::move(loader) : NSURLLoader::loaderWithLoading());
 }
 
 Ref<NSString> XQueryModules::builtinNamespaceForID(int64_t id) {
@@ -100,6 +101,20 @@ void XQueryModules::removePrologs() {
   _prologs.clear();
   // The registry may go with the last of them.
   const auto removed = std::move(_ownedPrologs);
+}
+
+Ref<NSString> XQueryModules::sourceAtLocation(const Ref<NSString>& location) {
+  const auto URL = NSURL::URLWithString(location);
+  if (!URL || !_loader || _sourceCount >= _loader->loading().limits.mostModules) return {};
+  ++_sourceCount;
+  const auto data =
+      _loader->URLHandle(URL, XQueryLoadPurpose::Module, true)->resourceData(*_loader);
+  if (!data) return {};
+  std::string_view text = data->bytes();
+  // The signature that some editors put before UTF-8 belongs to the file, not to the module.
+  constexpr std::string_view signature = "\xEF\xBB\xBF";
+  if (text.starts_with(signature)) text.remove_prefix(signature.size());
+  return NSString::stringWithUTF8(text);
 }
 
 }  // namespace xquery

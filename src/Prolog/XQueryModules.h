@@ -6,6 +6,7 @@
 // replaced under its ID is kept as well, for others may have copied its declarations by then.
 #pragma once
 
+#include "Platform/NSURLLoader.h"
 #include "Prolog/StringTable.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
@@ -35,7 +36,8 @@ enum XQueryNamespaceID : int64_t {
 class XQueryModules : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Modules; }
-  [[nodiscard]] static Ref<XQueryModules> modules();
+  // Null for a loader with the settings that a compilation starts with.
+  [[nodiscard]] static Ref<XQueryModules> modules(Ref<NSURLLoader> loader = nullptr);
 
   // The built-in URI for IDs 1 to 11, else null.
   static Ref<NSString> builtinNamespaceForID(int64_t id);
@@ -49,8 +51,14 @@ class XQueryModules : public NSCounted {
   void addProlog(Ref<XQueryProlog> prolog, int64_t forID);
   void removePrologs();
 
+  // The text at a location. Null when the location is no absolute URL, when it may not or cannot be
+  // read, when it is not UTF-8, and once the compilation has asked for as many as it may.
+  Ref<NSString> sourceAtLocation(const Ref<NSString>& location);
+  // Nothing is loaded any more: lets go of what was fetched.
+  void endLoading() { _loader = nullptr; }
+
  protected:
-  XQueryModules();
+  explicit XQueryModules(Ref<NSURLLoader> loader);
   ~XQueryModules() override;
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
@@ -60,6 +68,8 @@ class XQueryModules : public NSCounted {
   StringTable<int64_t> _namespaceIDs;      // the same namespaces
   std::vector<XQueryProlog*> _prologs;     // by ID
   std::vector<Ref<XQueryProlog>> _ownedPrologs;
+  Ref<NSURLLoader> _loader;  // null when nothing may be loaded any more
+  uint32_t _sourceCount = 0;
 };
 
 }  // namespace xquery

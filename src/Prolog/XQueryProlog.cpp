@@ -5,6 +5,7 @@
 
 #include "Expr/XQueryLeaves.h"
 #include "Prolog/XQueryDeclarations.h"
+#include "Prolog/XQueryModuleImporter.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryPrologItems.h"
 #include "Types/MessageText.h"
@@ -71,9 +72,9 @@ bool isBuiltinID(int64_t id) {
 
 // --- construction --------------------------------------------------------------------------------
 
-XQueryProlog::XQueryProlog(Ref<XQueryModules> modules)
+XQueryProlog::XQueryProlog(Ref<XQueryModules> modules, Ref<NSURLLoader> loader)
     : NSCounted(Kind::Prolog),
-      _modules(modules ? modules : XQueryModules::modules()),
+      _modules(modules ? modules : XQueryModules::modules(std::move(loader))),
       _madeModules(!modules),
       _namespacePrefixes(predeclaredSlots().begin(), predeclaredSlots().end()) {}
 
@@ -84,20 +85,23 @@ XQueryProlog::~XQueryProlog() {
 Ref<XQueryProlog> XQueryProlog::prologWithItems(const std::vector<Ref<XQueryPrologItem>>& items,
                                                 Ref<NSString> atLocation,
                                                 Ref<XQueryModules> forModules,
-                                                const Ref<NSString>& version) {
-  auto prolog = make<XQueryProlog>(std::move(forModules));
-  if (version && !(version->view() == "1.0")) {
-    prolog->addError(XQueryErrors::unsupportedVersion.error(version));
-  }
-  prolog->_location = std::move(atLocation);
-  prolog->_addItems(items);
-  if (prolog->isModule()) {
-    prolog->_modules->addProlog(prolog,
-                                prolog->namespaceIDForPrefix(prolog->_modulePrefix->view()));
-  }
-  prolog->_resolveImports();
-  prolog->_bindInfo();
+                                                const Ref<NSString>& version,
+                                                Ref<NSURLLoader> loader) {
+  auto prolog = make<XQueryProlog>(std::move(forModules), std::move(loader));
+  prolog->_start(items, std::move(atLocation), version);
+  XQueryModuleImporter().build(prolog);
+  if (prolog->_madeModules) prolog->_modules->endLoading();
   return prolog;
+}
+
+void XQueryProlog::_start(const std::vector<Ref<XQueryPrologItem>>& items, Ref<NSString> atLocation,
+                          const Ref<NSString>& version) {
+  if (version && !(version->view() == "1.0")) {
+    addError(XQueryErrors::unsupportedVersion.error(version));
+  }
+  _location = std::move(atLocation);
+  _addItems(items);
+  if (isModule()) _modules->addProlog(this, namespaceIDForPrefix(_modulePrefix->view()));
 }
 
 bool XQueryProlog::madeModules(const XQueryModules& modules) const {

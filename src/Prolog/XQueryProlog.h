@@ -16,6 +16,8 @@
 namespace xquery {
 
 class XQueryFunctionDecl;
+class NSURLLoader;
+class XQueryModuleImporter;
 class XQueryModules;
 class XQueryPrologItem;
 class XQueryPrologItemModuleImport;
@@ -48,10 +50,13 @@ class XQueryProlog : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Prolog; }
 
-  // `modules` null makes a new registry; `location` and `version` may be null.
+  // `modules` null makes a new registry, which fetches what is imported through the loader, or
+  // through one with the settings that a compilation starts with; `location` and `version` may be
+  // null.
   [[nodiscard]] static Ref<XQueryProlog> prologWithItems(
       const std::vector<Ref<XQueryPrologItem>>& items, Ref<NSString> atLocation,
-      Ref<XQueryModules> forModules, const Ref<NSString>& version);
+      Ref<XQueryModules> forModules, const Ref<NSString>& version,
+      Ref<NSURLLoader> loader = nullptr);
 
   XQueryModules& modules() const { return *_modules; }
   bool xmlSpacePreserve() const { return _xmlSpacePreserve; }
@@ -149,7 +154,7 @@ class XQueryProlog : public NSCounted {
   bool madeModules(const XQueryModules& modules) const;
 
   // Without a registry it makes one.
-  explicit XQueryProlog(Ref<XQueryModules> modules = nullptr);
+  explicit XQueryProlog(Ref<XQueryModules> modules = nullptr, Ref<NSURLLoader> loader = nullptr);
 
  protected:
   ~XQueryProlog() override;
@@ -159,7 +164,9 @@ class XQueryProlog : public NSCounted {
   void _importDeclarations(const XQueryProlog& module);
   void bindDeclaration(NSObject& declaration);
   void _addItems(const std::vector<Ref<XQueryPrologItem>>& items);
-  void _resolveImports();
+  // The first part of the building: before the imports.
+  void _start(const std::vector<Ref<XQueryPrologItem>>& items, Ref<NSString> atLocation,
+              const Ref<NSString>& version);
   void _bindInfo();
 
   struct NamedLocal {
@@ -197,6 +204,8 @@ class XQueryProlog : public NSCounted {
   bool _ordered = true;
   bool _emptyLeast = true;
   bool _inheritNamespaces = true;
+
+  friend class XQueryModuleImporter;
 };
 
 }  // namespace xquery

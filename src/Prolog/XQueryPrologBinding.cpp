@@ -1,9 +1,7 @@
 // The declarations of a prolog: their tables, the import of those of library modules, the numbering
 // of local variables, and the binding pass over the declarations.
 #include "Prolog/XQueryDeclarations.h"
-#include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
-#include "Prolog/XQueryPrologItems.h"
 #include "Types/XQueryErrors.h"
 
 namespace xquery {
@@ -62,19 +60,6 @@ void XQueryProlog::restoreLocalScope(const LocalScope& scope) {
 }
 
 // --- imports -------------------------------------------------------------------------------------
-
-void XQueryProlog::_resolveImports() {
-  for (const auto& item : _moduleImports) {
-    const int64_t id = namespaceID(item->namespaceString());
-    if (const XQueryProlog* module = _modules->prologForID(id)) {
-      _importDeclarations(*module);
-      continue;
-    }
-    // Without any location clause the failure is recorded twice.
-    if (!item->locations()) addError(XQueryErrors::moduleNotFound.error(item->description()));
-    addError(XQueryErrors::moduleNotFound.error(item->description()));
-  }
-}
 
 // Copies what the module declared in its own namespace, and nothing that it imported itself. A
 // module that imports itself finds each of its names taken, so the walk never sees its own growth.

@@ -143,6 +143,54 @@ TEST(URL, EqualityIsThatOfTheText) {
   EXPECT_FALSE(a->isEqual(*other));
 }
 
+struct PartsRow {
+  const char* text;
+  const char* scheme;
+  const char* host;
+  const char* path;
+};
+
+TEST(URL, SchemeHostAndPath) {
+  const PartsRow rows[] = {
+      {"http://a/b/c.xml?q=/x#y:z", "http", "a", "/b/c.xml"},
+      {"HTTP://A.B/c", "http", "A.B", "/c"},
+      {"http://user:pw@host:80/p", "http", "host", "/p"},
+      {"http://[::1]:80/p", "http", "[::1]", "/p"},
+      {"http://[::1]/p", "http", "[::1]", "/p"},
+      {"http://host", "http", "host", ""},
+      {"http://host?q", "http", "host", ""},
+      {"file:///a%20b/%41", "file", "", "/a b/A"},
+      {"file:/a", "file", "", "/a"},
+      {"urn:a:b", "urn", "", "a:b"},
+      {"mailto:x@y", "mailto", "", "x@y"},
+      {"//host/p", "", "host", "/p"},
+      {"/p:q", "", "", "/p:q"},
+      {"p/q:r", "", "", "p/q:r"},
+      {"?q:r", "", "", ""},
+      {"#a:b", "", "", ""},
+      {"", "", "", ""},
+  };
+  for (const PartsRow& row : rows) {
+    const Ref<NSURL> url = NSURL::URLWithString(text(row.text));
+    ASSERT_TRUE(url) << row.text;
+    EXPECT_EQ(url->scheme(), row.scheme) << row.text;
+    EXPECT_EQ(url->host(), row.host) << row.text;
+    EXPECT_EQ(url->path(), row.path) << row.text;
+    EXPECT_EQ(url->relativePath(), row.path) << row.text;
+  }
+}
+
+TEST(URL, RelativePathIsThatOfTheReferenceAsGiven) {
+  const Ref<NSURL> base = NSURL::URLWithString(text("http://h/a/b.html?x"));
+  const auto relativePath = [&](std::string_view reference) {
+    return NSURL::URLWithString(text(reference), *base)->relativePath();
+  };
+  EXPECT_EQ(relativePath("../c.xml"), "../c.xml");
+  EXPECT_EQ(relativePath("?y"), "");
+  EXPECT_EQ(relativePath("http://g/d.%68tm"), "/d.htm");
+  EXPECT_EQ(NSURL::URLWithString(text("?y"), *base)->path(), "/a/b.html");
+}
+
 TEST(URL, VeryLongReferencesAreHandled) {
   std::string path = "/";
   while (path.size() < 1000000) path += "../a/";

@@ -1,0 +1,63 @@
+// The documents and raw bodies of one context.
+#include "Eval/XQueryContextInternal.h"
+#include "xquery/XMLNode.h"
+
+#include <algorithm>
+
+namespace xquery {
+
+namespace {
+
+constexpr uint32_t XMLOptions = NSXMLNodePreserveEmptyElements | NSXMLNodePreserveCDATA;
+constexpr uint32_t HTMLOptions = XMLOptions | NSXMLDocumentTidyHTML;
+static_assert(XMLOptions == 0x1000006 && HTMLOptions == 0x1000206);
+
+std::string lowerCase(std::string text) {
+  for (char& letter : text) {
+    if (letter >= 'A' && letter <= 'Z') letter = static_cast<char>(letter - 'A' + 'a');
+  }
+  return text;
+}
+
+bool isHTML(const XQueryResource& resource, const NSURL& URL) {
+  if (resource.MIMEType && lowerCase(*resource.MIMEType) == "text/html") return true;
+  const std::string path = lowerCase(URL.relativePath());
+  return path.ends_with(".html") || path.ends_with(".htm");
+}
+
+}  // namespace
+
+void XQueryContextInternal::setLoading(const XQueryLoading& loading) {
+  _loader = NSURLLoader::loaderWithLoading(loading);
+}
+
+Value XQueryContextInternal::XQueryDocumentForURL(const Ref<NSURL>& URL) {
+  if (const auto found = _documentCache.find(URL); found != _documentCache.end()) {
+    return found->second;
+  }
+  // The host may set other settings while its loader is called.
+  const Ref<NSURLLoader> loader = _loader;
+  const auto resource = loader->load(*URL, XQueryLoadPurpose::Document);
+  Value result = NSNull::null();
+  if (resource && NSURLLoader::hasUsableStatus(*resource)) {
+    const uint32_t options = isHTML(*resource, *URL) ? HTMLOptions : XMLOptions;
+    if (const auto document = NSXMLDocument::documentWithData(resource->data, options)) {
+      document->setURI(URL->absoluteString());
+      result = document;
+    }
+  }
+  _documentCache.insert_or_assign(URL, result);
+  return result;
+}
+
+Ref<NSData> XQueryContextInternal::URLBody(const Ref<NSURL>& URL) {
+  // The documents are looked through here, not the handles: a handle is taken anew for each call,
+  // and it is the loader that gives the same one again.
+  if (_documentCache.contains(URL)) return {};
+  const Ref<NSURLLoader> loader = _loader;
+  const auto handle = loader->URLHandle(URL, XQueryLoadPurpose::Body, true);
+  _URLCache.insert_or_assign(URL, handle);
+  return handle->resourceData(*loader);
+}
+
+}  // namespace xquery
