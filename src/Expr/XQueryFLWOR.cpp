@@ -10,27 +10,12 @@
 #include "xquery/Collection.h"
 #include "xquery/Number.h"
 
-#include <memory>
-
 namespace xquery {
 
 // What the tuples have yielded: values, or items with their keys when there are order specs.
-class XQueryFLWORResults {
- public:
-  void add(Value value) { _values.add(std::move(value)); }
-  // Every item of the value, in order, with the keys of its tuple.
-  void add(const Value& value, std::vector<Value> keys) {
-    const XQueryItemList list(value.get());
-    if (list.count() == 0) return;
-    const auto shared = std::make_shared<const std::vector<Value>>(std::move(keys));
-    for (size_t i = 0; i < list.count(); ++i) _sortItems.push_back({list[i], shared, i});
-  }
-  Value value() { return _values.value(); }
-  std::vector<XQuerySortItem>& sortItems() { return _sortItems; }
-
- private:
-  XQueryGatherer _values;
-  std::vector<XQuerySortItem> _sortItems;
+struct XQueryFLWORResults {
+  XQueryGatherer values;
+  XQuerySortList sortList;
 };
 
 // --- clauses -------------------------------------------------------------------------------------
@@ -140,15 +125,13 @@ void XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toRe
     checkType(binding, value.get(), withContext);
     withContext._internal().setVariable(value, binding.varID());
   }
-  processItem(toResults, withContext);
+  if (!_forLet.empty()) processItem(toResults, withContext);
 }
 
 void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
                                   XQueryFLWORResults& toResults, XQueryContext& withContext) const {
   auto& dynamic = withContext._internal();
-  Value value = clause.evaluateWithContext(withContext);
-  // A sequence is flat already; other arrays may hold anything.
-  if (value && value->kind() == Kind::Array) value = XQuerySequence::sequenceWithItem(value);
+  const Value value = flattened(clause.evaluateWithContext(withContext));
   const XQueryItemList items(value.get());
   const bool isLast = index + 1 == _forLet.size();
   for (size_t k = 0; k < items.count(); ++k) {
@@ -174,39 +157,45 @@ void XQueryFLWORExpr::processItem(XQueryFLWORResults& toResults, XQueryContext& 
   }
   Value value = XQueryEvaluateOrEmpty(_returnExpr.get(), withContext);
   if (_orderSpecs.empty()) {
-    toResults.add(std::move(value));
+    toResults.values.add(std::move(value));
   } else {
-    toResults.add(value, orderKeys(withContext));
+    addSortItems(std::move(value), toResults.sortList, withContext);
   }
 }
 
-std::vector<Value> XQueryFLWORExpr::orderKeys(XQueryContext& context) const {
-  std::vector<Value> keys;
-  keys.reserve(_orderSpecs.size());
+// Adds every item of the value with the keys of the tuple.
+void XQueryFLWORExpr::addSortItems(Value value, XQuerySortList& toList,
+                                   XQueryContext& context) const {
+  const size_t sortInfo = toList.keys.size();
   for (const auto& spec : _orderSpecs) {
     Value key = XQueryAtomizationCheckingOccurrence(spec->evaluateWithContext(context),
                                                     XQueryOccurrenceAnyAlso, context);
     if (XQueryObjectTypeID(key.get()) == XQueryTypeUntypedAtomic) {
       key = XQueryCastAsTypeForContext(key, XQueryTypeString, context);
     }
-    keys.push_back(std::move(key));
+    toList.keys.push_back(std::move(key));
   }
-  return keys;
+  const Value flat = flattened(std::move(value));
+  const XQueryItemList items(flat.get());
+  if (items.count() == 0) toList.keys.resize(sortInfo);
+  for (size_t i = 0; i < items.count(); ++i) toList.items.push_back({items[i], sortInfo, i});
 }
 
 Value XQueryFLWORExpr::evaluateWithContext(XQueryContext& context) const {
   XQueryFLWORResults results;
+  results.sortList.keyCount = _orderSpecs.size();
   evaluateStartingAt(0, results, context);
-  if (_orderSpecs.empty()) return results.value();
+  if (_orderSpecs.empty()) return results.values.value();
 
-  std::vector<XQuerySortItem>& items = results.sortItems();
   const XQueryOrderSpec& first = *_orderSpecs.front();
-  if (!XQueryFLWORSort(items, first.ascending(), first.emptyLeast())) {
+  if (!XQueryFLWORSort(results.sortList, first.ascending(), first.emptyLeast())) {
     context._internal().raise(XQueryErrors::invalidType.errorAtLine(exprLine()));
   }
   auto sorted = XQuerySequence::sequence();
-  sorted->objects().reserve(items.size());
-  for (XQuerySortItem& item : items) sorted->addObject(item.value);
+  sorted->objects().reserve(results.sortList.items.size());
+  for (XQuerySortItem& item : results.sortList.items) {
+    sorted->objects().push_back(std::move(item.value));
+  }
   return normalised(std::move(sorted));
 }
 

@@ -10,7 +10,8 @@
 
 namespace xquery {
 
-class XQueryFLWORResults;
+struct XQueryFLWORResults;
+struct XQuerySortList;
 
 class XQueryForExpr : public XQueryBindingExpr {
  public:
@@ -113,7 +114,7 @@ class XQueryFLWORExpr : public XQueryExpr {
   void processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
   void checkType(const XQueryBindingExpr& clause, const NSObject* value,
                  XQueryContext& context) const;
-  std::vector<Value> orderKeys(XQueryContext& context) const;
+  void addSortItems(Value value, XQuerySortList& toList, XQueryContext& context) const;
 
   Clauses _forLet;
   Ref<XQueryExpr> _whereExpr;

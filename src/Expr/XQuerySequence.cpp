@@ -1,5 +1,6 @@
 #include "Expr/XQuerySequence.h"
 
+#include <algorithm>
 #include <vector>
 
 namespace xquery {
@@ -60,6 +61,16 @@ Value normalised(Value value) {
   const auto* array = dyn_cast<NSArray>(value);
   if (!array || array->count() > 1) return value;
   return array->count() == 1 ? array->objects().front() : Value(NSNull::null());
+}
+
+Value flattened(Value value) {
+  if (!value || value->kind() != Kind::Array) return value;  // an XQuerySequence is flat
+  const auto isItem = [](const Value& element) {
+    return element && !isNull(element) && !isa<NSArray>(element);
+  };
+  const std::vector<Value>& elements = cast<NSArray>(value)->objects();
+  if (std::all_of(elements.begin(), elements.end(), isItem)) return value;
+  return XQuerySequence::sequenceWithItem(value);
 }
 
 void XQueryGatherer::add(Value value) {

@@ -36,6 +36,10 @@ inline bool isNull(const Value& value) {
 // A one-element array becomes its element and an empty array NSNull; anything else is unchanged.
 Value normalised(Value value);
 
+// The value with nothing but items in it: of an array the sequence that adding it to an empty one
+// gives, which is the array itself when it is flat already. Anything else is unchanged.
+Value flattened(Value value);
+
 // Gathers values as the comma operator does: nothing gives NSNull, the first non-empty value is
 // kept as it is, a second one turns both into a sequence. `value` normalises.
 class XQueryGatherer {

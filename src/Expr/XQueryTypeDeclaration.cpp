@@ -16,12 +16,12 @@ Ref<XQueryTypeDeclaration> declaration(XQueryTypeDeclaration::Type type, Value d
   return make<XQueryTypeDeclaration>(static_cast<int>(type), std::move(data));
 }
 
-// Every member of a sequence, or the one item, must be of the type. A name that is no built-in type
-// matches nothing.
-bool matchesAtomicType(const NSObject& subject, const XQueryTypeDeclaration& type) {
+// Every member of a sequence of several items, or the one item, must be of the type. A name that is
+// no built-in type matches nothing; neither does an array that stands as an item.
+bool matchesAtomicType(const NSObject& subject, size_t count, const XQueryTypeDeclaration& type) {
   const XQueryTypeID id = type.typeID();
   if (id == XQueryTypeNone) return false;
-  const auto* array = dyn_cast<NSArray>(&subject);
+  const auto* array = count > 1 ? dyn_cast<NSArray>(&subject) : nullptr;
   if (!array) return XQueryIsKindOfType(XQueryObjectTypeID(&subject), id);
   for (const Value& member : array->objects()) {
     if (!XQueryIsKindOfType(XQueryObjectTypeID(member.get()), id)) return false;
@@ -67,11 +67,11 @@ bool matchesKindTest(const NSObject& subject, const XQueryTypeDeclaration& test,
   }
 }
 
-bool matchesType(const NSObject& subject, const XQueryTypeDeclaration& declaration,
+bool matchesType(const NSObject& subject, size_t count, const XQueryTypeDeclaration& declaration,
                  XQueryContext* context) {
   switch (declaration.type()) {
     case XQueryTypeDeclaration::Atomic:
-      return matchesAtomicType(subject, declaration);
+      return matchesAtomicType(subject, count, declaration);
     case XQueryTypeDeclaration::Item:
       return true;
     default:
@@ -178,7 +178,7 @@ bool XQueryInstanceOf(const NSObject* object, const XQueryTypeDeclaration& insta
   if (object->kind() == Kind::Null) {
     return instanceOf.type() == XQueryTypeDeclaration::Empty || instanceOf.acceptsCount(0);
   }
-  return matchesType(*object, instanceOf, forContext) && instanceOf.acceptsCount(count);
+  return matchesType(*object, count, instanceOf, forContext) && instanceOf.acceptsCount(count);
 }
 
 Value XQueryTreatAs(const Value& object, const XQueryTypeDeclaration& treatAs,

@@ -4,7 +4,6 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQuerySequence.h"
-#include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/Number.h"
 
@@ -54,7 +53,7 @@ Value XQueryCastExpr::evaluateWithContext(XQueryContext& context) const {
   Value result;
   if (_type->type() == XQueryTypeDeclaration::Atomic) {
     const bool allowEmpty = _type->occuranceType() == XQueryTypeDeclaration::ZeroOrOne;
-    result = XQueryCastObject(value, _type->typeID(), context, allowEmpty);
+    result = castObject(value, _type->typeID(), context, allowEmpty);
   }
   if (!result) context._internal().raise(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
   return result;
@@ -73,7 +72,7 @@ Value XQueryCastableExpr::evaluateWithContext(XQueryContext& context) const {
     dynamic.raise(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
   }
   try {
-    const Value cast = XQueryCastObject(value, _type->typeID(), context, true);
+    const Value cast = XQueryCastExpr::castObject(value, _type->typeID(), context, true);
     return XQueryInstanceOfExpr::object(cast, *_type, &context);
   } catch (const NSException&) {
     if (XQueryIsLimit(dynamic.error().get())) throw;

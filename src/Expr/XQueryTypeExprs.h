@@ -3,6 +3,7 @@
 
 #include "Expr/XQueryExpr.h"
 #include "Expr/XQueryTypeDeclaration.h"
+#include "Types/XQueryCasting.h"
 
 #include <utility>
 
@@ -59,6 +60,11 @@ class XQueryCastExpr : public XQueryTypedExpr {
  public:
   [[nodiscard]] static Ref<XQueryCastExpr> castExpr(Ref<XQueryExpr> expr,
                                                     Ref<XQueryTypeDeclaration> asType);
+  // Atomizes, then casts: see XQueryCastObject.
+  static Value castObject(const Value& object, XQueryTypeID asType, XQueryContext& forContext,
+                          bool allowEmpty) {
+    return XQueryCastObject(object, asType, forContext, allowEmpty);
+  }
   Value evaluateWithContext(XQueryContext& context) const override;
 
  protected:

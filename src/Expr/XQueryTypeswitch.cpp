@@ -33,13 +33,14 @@ void XQueryTypeswitchExpr::bindInfoForProlog(XQueryProlog& prolog) {
   for (const auto& clause : _caseClauses) clause->bindInfoForProlog(prolog);
 }
 
-const XQueryCaseClauseExpr& XQueryTypeswitchExpr::clauseFor(const NSObject* value,
+// Null without clauses.
+const XQueryCaseClauseExpr* XQueryTypeswitchExpr::clauseFor(const NSObject* value,
                                                             XQueryContext& context) const {
   for (size_t i = 0; i + 1 < _caseClauses.size(); ++i) {
     const XQueryTypeDeclaration* type = _caseClauses[i]->type();
-    if (type && XQueryInstanceOf(value, *type, &context)) return *_caseClauses[i];
+    if (type && XQueryInstanceOf(value, *type, &context)) return _caseClauses[i].get();
   }
-  return *_caseClauses.back();
+  return _caseClauses.empty() ? nullptr : _caseClauses.back().get();
 }
 
 Value XQueryTypeswitchExpr::evaluateClause(const XQueryCaseClauseExpr& clause, const Value& value,
@@ -58,7 +59,8 @@ Value XQueryTypeswitchExpr::evaluateWithContext(XQueryContext& context) const {
   XQueryCheckStack(context);
   const Value value = XQueryEvaluateOrEmpty(_expr.get(), context);
   if (isa<XQueryError>(value)) return value;
-  Value result = evaluateClause(clauseFor(value.get(), context), value, context);
+  const XQueryCaseClauseExpr* clause = clauseFor(value.get(), context);
+  Value result = clause ? evaluateClause(*clause, value, context) : Value();
   if (!result) context._internal().raise(XQueryErrors::invalidType.errorAtLine(exprLine()));
   return result;
 }

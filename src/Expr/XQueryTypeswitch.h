@@ -39,7 +39,7 @@ class XQueryTypeswitchExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  const XQueryCaseClauseExpr& clauseFor(const NSObject* value, XQueryContext& context) const;
+  const XQueryCaseClauseExpr* clauseFor(const NSObject* value, XQueryContext& context) const;
   Value evaluateClause(const XQueryCaseClauseExpr& clause, const Value& value,
                        XQueryContext& context) const;
 
