@@ -91,6 +91,8 @@ enum class Kind : uint8_t {
   TypeDeclaration,
   ForExpr,
   Param,
+  ElementExpr,
+  AttributeExpr,
   NamespaceExpr,
   OtherExpr,
   ExprLast = 255,

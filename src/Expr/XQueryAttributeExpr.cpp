@@ -2,7 +2,9 @@
 
 #include "Eval/StackGuard.h"
 #include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryContent.h"
 #include "Expr/XQueryContentText.h"
+#include "Expr/XQueryLeaves.h"
 #include "Platform/XMLTree.h"
 #include "Prolog/XQueryModules.h"
 #include "Types/XQueryErrors.h"
@@ -25,8 +27,7 @@ NSXMLNameRef attributeName(const XQueryConstructorName& expr, XQueryContext& con
   return name;
 }
 
-Value attribute(NSXMLNameRef name, NSMutableString& text) {
-  XQueryNormalizeAttributeString(text);
+Value attribute(NSXMLNameRef name, const NSMutableString& text) {
   return Ref<NSXMLNode>(NSXMLTree::makeLoneAttribute(name.detach(), text.view()));
 }
 
@@ -44,11 +45,31 @@ void XQueryAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
 
 Value XQueryAttributeExpr::evaluateWithContext(XQueryContext& context) const {
   NSXMLNameRef name = attributeName(_name, context, exprLine());
+  return attribute(std::move(name), valueText(context));
+}
+
+void XQueryAttributeExpr::addTo(XQueryElementContent& content, XQueryContext& context) const {
+  NSXMLNameRef name = attributeName(_name, context, exprLine());
+  content.addNewAttribute(std::move(name), valueText(context).view());
+}
+
+NSMutableString XQueryAttributeExpr::valueText(XQueryContext& context) const {
   NSMutableString text;
   for (const auto& item : _items) {
     XQueryAppendText(item->evaluateWithContext(context), text, context);
   }
-  return attribute(std::move(name), text);
+  XQueryNormalizeAttributeString(text);
+  return text;
+}
+
+size_t XQueryAttributeExpr::expectedTextLength() const {
+  size_t length = 0;
+  for (const auto& item : _items) {
+    const auto* literal = dyn_cast<XQueryLiteral>(item.get());
+    const auto* text = literal ? dyn_cast<NSString>(literal->literalValue()) : nullptr;
+    length += text ? text->length() : XQueryExpectedTextLength;
+  }
+  return length;
 }
 
 Ref<XQueryComputedAttributeExpr> XQueryComputedAttributeExpr::computedAttributeExprWithName(
@@ -67,6 +88,7 @@ Value XQueryComputedAttributeExpr::evaluateWithContext(XQueryContext& context) c
   NSXMLNameRef name = attributeName(_name, context, exprLine());
   NSMutableString text;
   if (_value) XQueryAppendText(_value->evaluateWithContext(context), text, context);
+  XQueryNormalizeAttributeString(text);
   return attribute(std::move(name), text);
 }
 

@@ -9,26 +9,39 @@
 
 namespace xquery {
 
+class XQueryElementContent;
+
 // An attribute of a direct constructor.
 class XQueryAttributeExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::AttributeExpr; }
+
   // The parts of the value are literals and enclosed expressions; `quoteChar` is the delimiter in
   // the query, 34 or 39.
   [[nodiscard]] static Ref<XQueryAttributeExpr> attributeExprWithName(
       const Ref<NSString>& name, std::vector<Ref<XQueryExpr>> forItems, char16_t enclosedWith);
 
   char16_t quoteChar() const { return _quoteChar; }
+  // Evaluates straight into an element that has no content yet.
+  void addTo(XQueryElementContent& content, XQueryContext& context) const;
+  // A guess at the length of the value: the literal parts, and a few digits for the rest.
+  size_t expectedTextLength() const;
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value evaluateWithContext(XQueryContext& context) const override;
 
  protected:
   XQueryAttributeExpr(const Ref<NSString>& name, std::vector<Ref<XQueryExpr>> items,
                       char16_t quoteChar)
-      : XQueryExpr(Kind::OtherExpr), _name(name), _items(std::move(items)), _quoteChar(quoteChar) {}
+      : XQueryExpr(Kind::AttributeExpr),
+        _name(name),
+        _items(std::move(items)),
+        _quoteChar(quoteChar) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
+  NSMutableString valueText(XQueryContext& context) const;
+
   XQueryConstructorName _name;
   std::vector<Ref<XQueryExpr>> _items;
   char16_t _quoteChar;

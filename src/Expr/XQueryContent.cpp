@@ -77,9 +77,13 @@ void XQueryContent::addNode(NSXMLNode& node) {
 
 // --- nodes ---------------------------------------------------------------------------------------
 
+NSXMLNode* XQueryContent::makeNode(Kind kind, NSStringView text) {
+  return NSXMLTree::of(&_parent)->makeNode(kind, text, _room);
+}
+
 void XQueryContent::flushText() {
   if (_text.length() == 0) return;
-  insert(*NSXMLTree::of(&_parent)->makeNode(Kind::Text, _text.view()));
+  insert(*makeNode(Kind::Text, _text.view()));
   _text.clear();
 }
 
@@ -98,13 +102,15 @@ void XQueryContent::addChild(NSXMLNode& node) {
 
 // --- elements ------------------------------------------------------------------------------------
 
-XQueryElementContent::XQueryElementContent(NSXMLElement& element,
+XQueryElementContent::XQueryElementContent(NSXMLElement& element, const NSXMLRoom& room,
                                            XQueryInScopeNamespaces& namespaces,
                                            XQueryContext& context, int64_t line)
     : XQueryContent(element, context, line),
       _namespaces(namespaces),
       _inheritNamespaces(!context._internal().activeProlog() ||
-                         context._internal().activeProlog()->inheritNamespaces()) {}
+                         context._internal().activeProlog()->inheritNamespaces()) {
+  setRoom(room);
+}
 
 void XQueryElementContent::addElement(NSXMLElement& child) {
   const Ref<NSXMLNode> added = adoptable(child);
@@ -116,32 +122,47 @@ void XQueryElementContent::addElement(NSXMLElement& child) {
   insert(*added);
 }
 
-bool XQueryElementContent::isNewName(const NSXMLNode& attribute) {
+bool XQueryElementContent::isNewName(const NSXMLExpandedName* name) {
   constexpr uint32_t few = 16;
-  const NSXMLExpandedName* name = attribute.expandedName();
   if (_names) return _names->insert(name).second;
-  if (_attributeCount == few)
-    _names = std::make_unique<std::unordered_set<const NSXMLExpandedName*>>();
   for (const NSXMLNode* other = element().firstAttribute(); other;
        other = NSXMLElement::nextAttribute(other)) {
     if (other->expandedName() == name) return false;
-    if (_names) _names->insert(other->expandedName());
   }
-  if (_names) _names->insert(name);
-  return true;
+  if (_attributeCount < few) return true;
+  _names = std::make_unique<std::unordered_set<const NSXMLExpandedName*>>();
+  for (const NSXMLNode* other = element().firstAttribute(); other;
+       other = NSXMLElement::nextAttribute(other)) {
+    _names->insert(other->expandedName());
+  }
+  return _names->insert(name).second;
 }
 
 // Attributes that differ in their expanded names are all kept, should their prefixes be the same.
-void XQueryElementContent::addAttribute(NSXMLNode& attribute) {
-  if (!_attributesAllowed) return;
-  if (!isNewName(attribute)) {
+void XQueryElementContent::prepareForAttribute(const NSXMLName& name) {
+  if (!isNewName(name.expanded)) {
     _context._internal().raise(XQueryErrors::attributeNotDistinct.errorAtLine(_line));
   }
-  const Ref<NSXMLNode> added = adoptable(attribute);
-  _namespaces.updateNamespacesForElement(element(), *added);
-  NSXMLTree::appendAttribute(&element(), added.get(), _lastAttribute);
-  _lastAttribute = added.get();
+  _namespaces.updateNamespacesForElement(element(), name);
+}
+
+void XQueryElementContent::append(NSXMLNode* attribute) {
+  NSXMLTree::appendAttribute(&element(), attribute, _lastAttribute);
+  _lastAttribute = attribute;
   ++_attributeCount;
+}
+
+void XQueryElementContent::addAttribute(NSXMLNode& attribute) {
+  if (!_attributesAllowed) return;
+  prepareForAttribute(*attribute.nodeName());
+  append(adoptable(attribute).get());
+}
+
+void XQueryElementContent::addNewAttribute(NSXMLNameRef name, NSStringView text) {
+  prepareForAttribute(*name.get());
+  NSXMLNode* attribute = makeNode(Kind::Attribute, text);
+  NSXMLTree::of(attribute)->setName(attribute, name.detach());
+  append(attribute);
 }
 
 // --- documents -----------------------------------------------------------------------------------

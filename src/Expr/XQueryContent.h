@@ -5,6 +5,8 @@
 // parent become children as they are, and nodes that have one are copied.
 #pragma once
 
+#include "Platform/XMLNames.h"
+#include "Platform/XMLTree.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
@@ -39,6 +41,9 @@ class XQueryContent {
   // Anything but an attribute or a namespace has been added.
   virtual void noteContent() {}
 
+  // Where nodes made here go first.
+  void setRoom(const NSXMLRoom& room) { _room = room; }
+  NSXMLNode* makeNode(Kind kind, NSStringView text);
   void appendText(NSStringView text) { _text.append(text); }
   void flushText();
   // The node itself where it may be moved, else a copy.
@@ -57,14 +62,19 @@ class XQueryContent {
   void addNode(NSXMLNode& node);
 
   NSMutableString _text;
+  NSXMLRoom _room;
   bool _previousWasAtomic = false;
 };
 
 // Attributes are taken up to the first other content; later ones are left out.
 class XQueryElementContent final : public XQueryContent {
  public:
-  XQueryElementContent(NSXMLElement& element, XQueryInScopeNamespaces& namespaces,
-                       XQueryContext& context, int64_t line);
+  // `room` is what was left behind the element when it was made.
+  XQueryElementContent(NSXMLElement& element, const NSXMLRoom& room,
+                       XQueryInScopeNamespaces& namespaces, XQueryContext& context, int64_t line);
+
+  // What adding the attribute as a content item would do, without making it a tree of its own.
+  void addNewAttribute(NSXMLNameRef name, NSStringView text);
 
  private:
   void addElement(NSXMLElement& element) override;
@@ -73,7 +83,10 @@ class XQueryElementContent final : public XQueryContent {
   // Texts next to each other become one node.
   void addText(NSXMLNode& text) override { appendText(text.textView()); }
   void noteContent() override { _attributesAllowed = false; }
-  bool isNewName(const NSXMLNode& attribute);
+  bool isNewName(const NSXMLExpandedName* name);
+  // Checks that the name is new to the element, and declares what it needs.
+  void prepareForAttribute(const NSXMLName& name);
+  void append(NSXMLNode* attribute);
   NSXMLElement& element() const { return static_cast<NSXMLElement&>(_parent); }
 
   XQueryInScopeNamespaces& _namespaces;

@@ -2,11 +2,17 @@
 
 #include "Eval/StackGuard.h"
 #include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryAttributeExpr.h"
 #include "Expr/XQueryContent.h"
+#include "Expr/XQueryContentText.h"
+#include "Expr/XQueryElementContentString.h"
 #include "Expr/XQueryInScopeNamespaces.h"
+#include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryNodeExprs.h"
 #include "Platform/XMLTree.h"
 #include "Prolog/XQueryProlog.h"
+
+#include <algorithm>
 
 namespace xquery {
 
@@ -34,7 +40,35 @@ void collectNamespaces(const XQueryElementExpr::Exprs& exprs,
   }
 }
 
+size_t roomForText(size_t length) {
+  return NSXMLTree::roomForNode + (length + 7) / 8 * 8;
+}
+
 }  // namespace
+
+// What the attributes take, and the text of an element that has no element constructors among its
+// content. Only a guess: what finds no room is put elsewhere.
+size_t XQueryElementExpr::roomBytes() const {
+  constexpr size_t most = 4096;
+  size_t bytes = 0;
+  for (const auto& expr : _attributes) {
+    const auto* attribute = dyn_cast<XQueryAttributeExpr>(expr.get());
+    if (attribute) bytes += roomForText(attribute->expectedTextLength());
+  }
+  size_t textLength = 0;
+  bool mayBeText = false;
+  for (const auto& item : _items) {
+    const auto* literal = dyn_cast<XQueryLiteral>(item.get());
+    const auto* run =
+        literal ? dyn_cast<XQueryElementContentString>(literal->literalValue()) : nullptr;
+    if (isa<XQueryElementExpr>(item.get())) return std::min(bytes, most);
+    if (run && run->isXMLSpace()) continue;
+    mayBeText = true;
+    textLength += run ? run->view().length() : XQueryExpectedTextLength;
+  }
+  if (mayBeText) bytes += roomForText(textLength);
+  return std::min(bytes, most);
+}
 
 void XQueryElementExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
@@ -44,6 +78,7 @@ void XQueryElementExpr::bindInfoForProlog(XQueryProlog& prolog) {
   _name.bind(prolog, Kind::Element, exprLine());
   for (const auto& attribute : _attributes) attribute->bindInfoForProlog(prolog);
   for (const auto& item : _items) item->bindInfoForProlog(prolog);
+  _roomBytes = roomBytes();
   if (!_namespaces.empty()) prolog.popInScopeNamespaces();
 }
 
@@ -52,14 +87,21 @@ Value XQueryElementExpr::evaluateWithContext(XQueryContext& context) const {
   auto& dynamic = context._internal();
   XQueryInScopeNamespaces namespaces(dynamic);
   if (!_namespaces.empty()) namespaces.push(_namespaces);
+  NSXMLRoom room;
   const Ref<NSXMLElement> element =
-      NSXMLTree::makeLoneElement(_name.evaluate(context, exprLine()).detach());
+      NSXMLTree::makeLoneElement(_name.evaluate(context, exprLine()).detach(), _roomBytes, room);
   dynamic.setBaseURI(dynamic.baseURI(), element.get());
   for (const auto& declaration : _namespaces) element->addNamespace(declaration->copy());
-  namespaces.updateNamespacesForElement(*element, *element);
+  namespaces.updateNamespacesForElement(*element, *element->nodeName());
 
-  XQueryElementContent content(*element, namespaces, context, exprLine());
-  for (const auto& attribute : _attributes) content.add(attribute->evaluateWithContext(context));
+  XQueryElementContent content(*element, room, namespaces, context, exprLine());
+  for (const auto& expr : _attributes) {
+    if (const auto* attribute = dyn_cast<XQueryAttributeExpr>(expr.get())) {
+      attribute->addTo(content, context);
+    } else {
+      content.add(expr->evaluateWithContext(context));
+    }
+  }
   for (const auto& item : _items) content.add(item->evaluateWithContext(context));
   content.finish();
   return element;

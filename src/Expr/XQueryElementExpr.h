@@ -11,6 +11,8 @@ namespace xquery {
 
 class XQueryElementExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::ElementExpr; }
+
   using Exprs = std::vector<Ref<XQueryExpr>>;
 
   // A direct constructor. Each item of the content is evaluated on its own.
@@ -25,7 +27,7 @@ class XQueryElementExpr : public XQueryExpr {
 
  protected:
   XQueryElementExpr(XQueryConstructorName name, Exprs attributes, Exprs items)
-      : XQueryExpr(Kind::OtherExpr),
+      : XQueryExpr(Kind::ElementExpr),
         _name(std::move(name)),
         _attributes(std::move(attributes)),
         _items(std::move(items)) {}
@@ -36,6 +38,9 @@ class XQueryElementExpr : public XQueryExpr {
   XQueryConstructorName _name;
   Exprs _attributes;  // attribute and namespace expressions
   Exprs _items;
+  size_t roomBytes() const;
+
+  size_t _roomBytes = 0;                    // for the attributes and the text of an element
   std::vector<Ref<NSXMLNode>> _namespaces;  // declared with literal URIs; copied into each element
 };
 

@@ -1,6 +1,7 @@
 #include "Expr/XQueryInScopeNamespaces.h"
 
 #include "Eval/XQueryContextInternal.h"
+#include "Platform/XMLNames.h"
 #include "Types/XQueryNodeFunctions.h"
 
 #include <algorithm>
@@ -41,9 +42,9 @@ void XQueryInScopeNamespaces::push(std::vector<Ref<NSXMLNode>> namespaces) {
 }
 
 bool XQueryInScopeNamespaces::updateNamespacesForElement(NSXMLElement& element,
-                                                         const NSXMLNode& named) {
-  const NSStringView prefix = named.prefixView();
-  const NSStringView URI = named.URIView();
+                                                         const NSXMLName& qName) {
+  const NSStringView prefix = NSXMLPrefixOf(qName);
+  const NSStringView URI = NSXMLURIOf(*qName.expanded);
   if (URI.isEmpty() || isPredefined(prefix) || isDeclaredAs(prefix, URI, _context)) return false;
   push({NSXMLNode::namespaceWithName(prefix, URI)});
   element.addNamespace(NSXMLNode::namespaceWithName(prefix, URI));

@@ -23,10 +23,10 @@ class XQueryInScopeNamespaces {
 
   void push(std::vector<Ref<NSXMLNode>> namespaces);
 
-  // Declares the prefix of the name of `named`, the element itself or an attribute that it gets, on
-  // the element, unless an element under construction has declared it with the same URI already.
+  // Declares the prefix of a name, the element's own or that of an attribute it gets, on the
+  // element, unless an element under construction has declared it with the same URI already.
   // Predefined prefixes need no declaration. Answer: whether it declared it.
-  bool updateNamespacesForElement(NSXMLElement& element, const NSXMLNode& named);
+  bool updateNamespacesForElement(NSXMLElement& element, const NSXMLName& qName);
 
   // For a copy taken out of `formerParent` where namespaces are not inherited: declares what was in
   // scope there and means something else here.

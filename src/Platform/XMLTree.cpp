@@ -1,6 +1,7 @@
 #include "Platform/XMLTree.h"
 
 #include "Platform/XMLNames.h"
+#include "Platform/XMLTreeExtra.h"
 
 #include <algorithm>
 #include <cstdlib>
@@ -72,61 +73,6 @@ std::mutex& orderLock(const NSXMLTree* tree) {
 
 }  // namespace
 
-// --- the extra part --------------------------------------------------------------------------
-
-struct NSXMLTreeExtra {
-  // Where the next node and text of a tree that grows in bulk go.
-  bool isBulk = false;
-  char* nodeBlock = nullptr;
-  char* nodeCursor = nullptr;
-  char* nodeEnd = nullptr;
-  char* textCursor = nullptr;
-  char* textEnd = nullptr;
-  size_t nextNodeBlock = 0;
-  size_t nextTextBlock = 0;
-
-  NSXMLNameSet names;                     // one count each
-  std::vector<NSXMLDocument*> documents;  // those with a URI
-};
-
-NSXMLTreeExtra* NSXMLTree::extra() const {
-  return (_extra & 1) ? nullptr : reinterpret_cast<NSXMLTreeExtra*>(_extra);
-}
-
-NSXMLTreeExtra& NSXMLTree::makeExtra() {
-  if (NSXMLTreeExtra* present = extra()) return *present;
-  auto made = std::make_unique<NSXMLTreeExtra>();
-  if (_extra) made->names.insert(reinterpret_cast<const NSXMLName*>(_extra & ~uintptr_t{1}));
-  _extra = reinterpret_cast<uintptr_t>(made.get());
-  return *made.release();
-}
-
-template <class Function>
-void NSXMLTree::forEachName(Function function) const {
-  if (_extra & 1) {
-    function(reinterpret_cast<const NSXMLName*>(_extra & ~uintptr_t{1}));
-  } else if (const NSXMLTreeExtra* present = extra()) {
-    present->names.forEach(function);
-  }
-}
-
-void NSXMLTree::adopt(const NSXMLName* name) {
-  const uintptr_t single = reinterpret_cast<uintptr_t>(name) | 1;
-  if (_extra == 0) {
-    _extra = single;
-  } else if (_extra == single || !makeExtra().names.insert(name)) {
-    NSXMLReleaseName(name);
-  }
-}
-
-void NSXMLTree::use(const NSXMLName* name) {
-  const NSXMLTreeExtra* present = extra();
-  if (_extra == (reinterpret_cast<uintptr_t>(name) | 1)) return;
-  if (present && present->names.contains(name)) return;
-  NSXMLRetainName(name);
-  adopt(name);
-}
-
 // --- life ------------------------------------------------------------------------------------
 
 NSXMLTree* NSXMLTree::create() {
@@ -140,7 +86,7 @@ void NSXMLTree::destroy() {
   forEachName([](const NSXMLName* name) { NSXMLReleaseName(name); });
   freeBaseURIs();
   freeBlocks();
-  const std::unique_ptr<NSXMLTreeExtra> owned(extra());
+  freeExtra();
   NSCounted::operator delete(this, sizeof(NSXMLTree));
 }
 
@@ -226,17 +172,14 @@ void NSXMLTree::startBulk(size_t nodeBytes, size_t textBytes) {
 }
 
 void NSXMLTree::endBulk() {
-  const NSXMLTreeExtra* state = extra();
+  NSXMLTreeExtra* state = extra();
   if (!state) return;
-  if (state->names.count() > 1 || !state->documents.empty()) {
-    extra()->isBulk = false;
-    return;
-  }
+  state->isBulk = false;
+  if (!state->documents.empty() || state->names.count() > NSXMLNameList::longest) return;
   // A small tree needs no extra part any more.
-  const std::unique_ptr<NSXMLTreeExtra> owned(extra());
+  const std::unique_ptr<NSXMLTreeExtra> owned(state);
   _extra = 0;
-  owned->names.forEach(
-      [this](const NSXMLName* name) { _extra = reinterpret_cast<uintptr_t>(name) | 1; });
+  owned->names.forEach([this](const NSXMLName* name) { adopt(name); });
 }
 
 void* NSXMLTree::allocateBulkNode(size_t bytes, uint16_t& distance) {
@@ -283,12 +226,17 @@ void* NSXMLTree::allocateText(size_t bytes) {
 // --- nodes -----------------------------------------------------------------------------------
 
 template <class Node, class... Arguments>
-Node* NSXMLTree::makeNodeOf(size_t textBytes, Arguments... arguments) {
-  uint16_t distance = 0;
-  void* memory = allocateNode(sizeof(Node), textBytes, distance);
+Node* NSXMLTree::placeNode(void* memory, uint16_t distance, Arguments... arguments) {
   Node* node = ::new (memory) Node(arguments...);
   node->_aux = distance;
   return node;
+}
+
+template <class Node, class... Arguments>
+Node* NSXMLTree::makeNodeOf(size_t textBytes, Arguments... arguments) {
+  uint16_t distance = 0;
+  void* memory = allocateNode(sizeof(Node), textBytes, distance);
+  return placeNode<Node>(memory, distance, arguments...);
 }
 
 NSXMLElement* NSXMLTree::makeElement() {
@@ -369,11 +317,37 @@ NSXMLElement* NSXMLTree::makeLoneElement(NSStringView name, NSStringView URI) {
   return element;
 }
 
-NSXMLElement* NSXMLTree::makeLoneElement(const NSXMLName* name) {
+NSXMLElement* NSXMLTree::makeLoneElement(const NSXMLName* name, size_t roomBytes, NSXMLRoom& room) {
   NSXMLTree* tree = create();
-  NSXMLElement* element = tree->makeElement();
+  const size_t bytes = sizeof(NSXMLElement) + roomBytes;
+  NSXMLBlock* block = tree->allocateBlock(bytes);
+  auto* element = placeNode<NSXMLElement>(block + 1, uint16_t{sizeof(NSXMLBlock) / distanceUnit});
   tree->setName(element, name);
+  room._block = reinterpret_cast<char*>(block);
+  room._cursor = reinterpret_cast<char*>(element + 1);
+  room._end = room._block + roundedUp(sizeof(NSXMLBlock) + bytes, blockGranule);
   return element;
+}
+
+NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text, NSXMLRoom& room) {
+  if (static_cast<size_t>(room._end - room._cursor) < sizeof(NSXMLNode)) {
+    return makeNode(kind, text);
+  }
+  auto* node = placeNode<NSXMLNode>(
+      room._cursor, static_cast<uint16_t>((room._cursor - room._block) / ptrdiff_t{distanceUnit}),
+      kind);
+  room._cursor += sizeof(NSXMLNode);
+  const bool narrow = isNarrow(text);
+  const size_t textBytes = narrow ? text.length() : bytesOf(text);
+  const size_t rounded = roundedUp(textBytes, distanceUnit);
+  void* memory = room._cursor;
+  if (rounded <= static_cast<size_t>(room._end - room._cursor)) {
+    room._cursor += rounded;
+  } else {
+    memory = allocateText(textBytes);
+  }
+  setStoredText(node, copyText(memory, text, narrow));
+  return node;
 }
 
 NSXMLNode* NSXMLTree::makeLoneAttribute(const NSXMLName* name, NSStringView text) {
@@ -406,22 +380,6 @@ void NSXMLTree::absorb(NSXMLTree* smaller) {
   const uint64_t sum = uint64_t{references} + smaller->references;
   references = sum >= immortalBit ? immortalBit : static_cast<uint32_t>(sum);
   NSCounted::operator delete(smaller, sizeof(NSXMLTree));
-}
-
-void NSXMLTree::absorbExtra(NSXMLTree* smaller) {
-  // The larger set of names takes in the smaller one.
-  const NSXMLTreeExtra* theirs = smaller->extra();
-  const NSXMLTreeExtra* ours = extra();
-  if (theirs && (!ours || theirs->names.count() > ours->names.count())) {
-    std::swap(_extra, smaller->_extra);
-  }
-  smaller->forEachName([this](const NSXMLName* name) { adopt(name); });
-  if (NSXMLTreeExtra* rest = smaller->extra()) {
-    auto& documents = makeExtra().documents;
-    documents.insert(documents.end(), rest->documents.begin(), rest->documents.end());
-    const std::unique_ptr<NSXMLTreeExtra> owned(rest);
-  }
-  smaller->_extra = 0;
 }
 
 // --- structure -------------------------------------------------------------------------------

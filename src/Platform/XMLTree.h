@@ -39,6 +39,17 @@ class NSXMLProcessingInstruction : public NSXMLNode {
 };
 
 struct NSXMLTreeExtra;
+struct NSXMLNameList;
+
+// Room behind an element made singly for the attributes and texts that it gets next, so that a
+// small element is one block. Belongs to whoever makes the element.
+class NSXMLRoom {
+ private:
+  char* _block = nullptr;
+  char* _cursor = nullptr;
+  char* _end = nullptr;
+  friend class NSXMLTree;
+};
 
 // A base URI on record for a node. The entries of a tree are a ring: the tree knows the one found
 // or added last, and two rings are joined in constant time. Nodes are recorded in about the order
@@ -78,8 +89,12 @@ class NSXMLTree : public NSXMLTreeHead {
   [[nodiscard]] static NSXMLNode* makeLoneNode(Kind kind, NSStringView text, NSStringView name,
                                                NSStringView URI = {});
   [[nodiscard]] static NSXMLElement* makeLoneElement(NSStringView name, NSStringView URI);
-  // The tree takes over one count of the name.
-  [[nodiscard]] static NSXMLElement* makeLoneElement(const NSXMLName* name);
+  // The tree takes over one count of the name. The room is of that many bytes at least.
+  [[nodiscard]] static NSXMLElement* makeLoneElement(const NSXMLName* name, size_t roomBytes,
+                                                     NSXMLRoom& room);
+  // An attribute or a text, in the room as far as that goes; in the element's tree in any case.
+  NSXMLNode* makeNode(Kind kind, NSStringView text, NSXMLRoom& room);
+  static constexpr size_t roomForNode = sizeof(NSXMLNode);
   [[nodiscard]] static NSXMLNode* makeLoneAttribute(const NSXMLName* name, NSStringView text);
 
   // --- names and texts -------------------------------------------------------------------------
@@ -97,6 +112,7 @@ class NSXMLTree : public NSXMLTreeHead {
   void adopt(const NSXMLName* name);
   // Counts the name for this tree unless it is counted already.
   void use(const NSXMLName* name);
+  bool holds(const NSXMLName* name) const;
   // Copies the text into the arena, in 8-bit form if it fits it.
   void setText(NSXMLNode* node, NSStringView text);
   // Room for that many bytes of text, at an even address for the sake of UTF-16.
@@ -168,10 +184,17 @@ class NSXMLTree : public NSXMLTreeHead {
   void* allocateNode(size_t bytes, size_t textBytes, uint16_t& distance);
   void* allocateBulkNode(size_t bytes, uint16_t& distance);
   template <class Node, class... Arguments>
+  static Node* placeNode(void* memory, uint16_t distance, Arguments... arguments);
+  template <class Node, class... Arguments>
   Node* makeNodeOf(size_t textBytes, Arguments... arguments);
 
+  // The names of the tree and what else it may hold (XMLTreeExtra.h).
   NSXMLTreeExtra* extra() const;
   NSXMLTreeExtra& makeExtra();
+  void freeExtra();
+  const NSXMLName* singleName() const;
+  NSXMLNameList* nameList() const;
+  void setNameList(NSXMLNameList* list);
   template <class Function>
   void forEachName(Function function) const;
 
@@ -188,7 +211,10 @@ class NSXMLTree : public NSXMLTreeHead {
   uint8_t blockCountHigh = 0;  // saturates; only compared
   uint16_t blockCountLow = 0;
   NSXMLBlock* _lastBlock = nullptr;
-  // 0, or the only name of the tree with the low bit set, or an NSXMLTreeExtra.
+  // 0; the only name of the tree; a list of its few names; or an extra part. The low bits tell.
+  static constexpr uintptr_t nameTag = 1;
+  static constexpr uintptr_t listTag = 2;
+  static constexpr uintptr_t tagBits = 3;
   uintptr_t _extra = 0;
   NSXMLBaseURI* _baseURIs = nullptr;
 };
