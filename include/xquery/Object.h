@@ -71,6 +71,8 @@ enum class Kind : uint8_t {
   ParserText,
   URLHandle,
   PathResults,
+  Frame,  // XQueryFrame
+  BuiltInFunction,
   PathStepFirst,
   AxisStep = PathStepFirst,
   FilterStep,
@@ -94,6 +96,7 @@ enum class Kind : uint8_t {
   ElementExpr,
   AttributeExpr,
   NamespaceExpr,
+  FunctionCall,
   OtherExpr,
   ExprLast = 255,
 };

@@ -25,24 +25,9 @@ uint64_t nextBaseURIOwner() {
 }  // namespace
 
 XQueryContextInternal::XQueryContextInternal()
-    : _variables(std::make_shared<XQueryFrame>()),
-      _baseURIOwner(nextBaseURIOwner()),
-      _loader(NSURLLoader::loaderWithLoading()) {}
+    : _baseURIOwner(nextBaseURIOwner()), _loader(NSURLLoader::loaderWithLoading()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;
-
-NSObject* XQueryContextInternal::variableForID(int64_t varID) const {
-  if (varID < 1 || !_variables || static_cast<size_t>(varID) >= _variables->size()) return nullptr;
-  return (*_variables)[static_cast<size_t>(varID)].get();
-}
-
-void XQueryContextInternal::setVariable(const Value& value, int64_t forID) {
-  if (!_variables) _variables = std::make_shared<XQueryFrame>();
-  if (forID < 1) return;
-  const auto index = static_cast<size_t>(forID);
-  while (_variables->size() <= index) _variables->push_back(NSNull::null());
-  (*_variables)[index] = value;
-}
 
 NSObject* XQueryContextInternal::globalForQName(const XQueryQName& qName) const {
   const auto found = _globals.find(qName);

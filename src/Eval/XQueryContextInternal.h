@@ -2,6 +2,7 @@
 // error and what is kept from one evaluation to the next.
 #pragma once
 
+#include "Eval/XQueryFrame.h"
 #include "Platform/NSURLLoader.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Error.h"
@@ -19,10 +20,6 @@ namespace xquery {
 
 class XQueryProlog;
 
-// One frame of local variables, indexed by local variable ID; index 0 is never used.
-using XQueryFrame = std::vector<Value>;
-using XQueryFrameRef = std::shared_ptr<XQueryFrame>;
-
 // Whether the error says that a limit of the engine was reached. Such an error ends the evaluation
 // even where others are passed over.
 bool XQueryIsLimit(const XQueryError* error);
@@ -34,11 +31,19 @@ class XQueryContextInternal {
 
   // --- variables -------------------------------------------------------------------------------
   // Null for an ID below 1 or past the end; a slot that was never set holds NSNull.
-  NSObject* variableForID(int64_t varID) const;
+  NSObject* variableForID(int64_t varID) const {
+    return _variables ? _variables->valueForID(varID) : nullptr;
+  }
   // ID 0 is ignored.
-  void setVariable(const Value& value, int64_t forID);
+  void setVariable(Value value, int64_t forID) {
+    if (!_variables) _variables = make<XQueryFrame>();
+    if (forID > 0) _variables->setValue(std::move(value), forID);
+  }
+  // The frame in force: null where no variable was set since one was taken away.
   XQueryFrameRef _inScopeVariables() const { return _variables; }
   void _setInScopeVariables(XQueryFrameRef variables) { _variables = std::move(variables); }
+  // Installs the given frame and leaves the former one in its place.
+  void _exchangeInScopeVariables(XQueryFrameRef& variables) { _variables.swap(variables); }
   NSObject* globalForQName(const XQueryQName& qName) const;
   void setGlobal(const Value& value, const Ref<XQueryQName>& forQName);
   void _clearGlobals();
