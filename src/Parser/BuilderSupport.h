@@ -7,8 +7,6 @@
 #include "Parser/XQueryParser.h"
 #include "xquery/Collection.h"
 
-#include <string_view>
-
 namespace xquery {
 
 template <class T>
@@ -52,12 +50,6 @@ std::vector<Ref<T>> XQVector(NSObject* list) {
   result.reserve(array->count());
   for (const Value& object : array->objects()) result.push_back(XQRef<T>(object.get()));
   return result;
-}
-
-// Reports a construct that cannot be compiled and stands in for it.
-inline NSObject* XQUnavailable(std::string_view construct, int64_t line) {
-  XQueryParserUnavailable(construct, line);
-  return XQEmptyLiteral(line);
 }
 
 }  // namespace xquery

@@ -5,6 +5,7 @@
 #include "Expr/XQueryQuantified.h"
 #include "Expr/XQueryTypeExprs.h"
 #include "Expr/XQueryTypeswitch.h"
+#include "Functions/XQueryFunctionCall.h"
 #include "Parser/BuilderSupport.h"
 #include "Parser/XQueryTokens.h"
 #include "Types/XQueryErrors.h"
@@ -282,8 +283,10 @@ NSObject* XQOrderedExpr(NSObject* expr, bool ordered, int64_t line) {
   return XQAtLine(XQueryOrderExpr::orderExpr(XQRef<XQueryExpr>(expr), ordered), line);
 }
 
-NSObject* XQFunctionCall(NSObject*, NSObject*, int64_t line) {
-  return XQUnavailable("function calls", line);
+NSObject* XQFunctionCall(NSObject* name, NSObject* args, int64_t line) {
+  return XQAtLine(
+      XQueryFunctionCall::functionCallWithName(XQRef<NSString>(name), XQRef<XQueryArgs>(args)),
+      line);
 }
 
 NSObject* XQFunctionArgs(NSObject* expr) {

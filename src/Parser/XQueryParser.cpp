@@ -93,7 +93,6 @@ void XQueryParser::parse() {
     yyparse_result = nullptr;
     // A failed run may leave what an unfinished rule had built.
     if (XQparse() == 0) _parsedModule = cast<XQueryParsedModule>(yyparse_result);
-    reportUnavailable();
   } catch (const NSException&) {
     // The error was recorded before it was raised.
     _parsedModule = nullptr;
@@ -104,17 +103,6 @@ void XQueryParser::parse() {
     _parsedModule = nullptr;
     setError(XQueryErrors::parserFailure.error(std::string_view(failure.what())));
   }
-}
-
-void XQueryParser::setUnavailable(std::string_view construct, int64_t line) {
-  if (!_unavailable.empty() && _unavailableLine <= line) return;
-  _unavailable = construct;
-  _unavailableLine = line;
-}
-
-void XQueryParser::reportUnavailable() {
-  if (_unavailable.empty() || !_errors.empty()) return;
-  record(XQueryErrors::unavailableConstruct.errorAtLine(_unavailableLine, _unavailable));
 }
 
 Ref<NSString> XQueryParser::sourceLine(int64_t index) {
@@ -195,10 +183,6 @@ void XQueryParserSetSetterFlag(unsigned flag, int64_t line) {
     sXQueryParserSetterFlags |= flag;
     return;
   }
-}
-
-void XQueryParserUnavailable(std::string_view construct, int64_t line) {
-  sXQueryParserCurrent->setUnavailable(construct, line);
 }
 
 }  // namespace xquery

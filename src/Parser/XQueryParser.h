@@ -56,8 +56,6 @@ class XQueryParser : public NSCounted {
   // Keeps the object alive until the parse ends.
   void autorelease(Value object) { _pool.push_back(std::move(object)); }
   void* allocate(size_t size);
-  // Remembers the first construct of the query that the engine cannot compile.
-  void setUnavailable(std::string_view construct, int64_t line);
 
   // Makes a parser the current one and the caller the owner of the process-wide lock.
   class Session {
@@ -82,7 +80,6 @@ class XQueryParser : public NSCounted {
 
  private:
   void parse();
-  void reportUnavailable();
 
   std::vector<Ref<XQueryError>> _errors;
   Ref<NSString> _source;
@@ -94,8 +91,6 @@ class XQueryParser : public NSCounted {
   bool _hasUTF8String = false;
   std::vector<Value> _pool;
   std::vector<std::unique_ptr<char[]>> _blocks;
-  std::string _unavailable;
-  int64_t _unavailableLine = 0;
 };
 
 // The value of the last grammar run; owned by the current parser's pool.
@@ -128,8 +123,5 @@ void XQueryParserExtension(const Ref<NSString>& name, const Ref<NSString>& conte
 void XQueryParserPragma(const Ref<NSString>& name, const Ref<NSString>& content, int64_t line);
 // The second declaration of one kind is an error at its line; an unknown flag is ignored.
 void XQueryParserSetSetterFlag(unsigned flag, int64_t line);
-// For a construct that the grammar knows and the engine cannot compile. A query reports one of
-// them, the one on the lowest line, and only when nothing else is wrong with it.
-void XQueryParserUnavailable(std::string_view construct, int64_t line);
 
 }  // namespace xquery

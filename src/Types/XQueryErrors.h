@@ -58,7 +58,6 @@ inline constexpr XQueryErrorText<> rangeTooLong{0, "limit: range of too many ite
 
 // --- parsing -------------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<1> unavailableConstruct{0, "%@ are not available in this build"};
 inline constexpr XQueryErrorText<> notUTF8{3, "the query is not well-formed UTF-8"};
 inline constexpr XQueryErrorText<2> scannerError{3, "%@ - %@"};
 inline constexpr XQueryErrorText<3> invalidToken{3, "%@ invalid token (%@)- %@"};
@@ -146,6 +145,19 @@ inline constexpr XQueryErrorText<> invalidDocumentNode{28, "invalid node for doc
 inline constexpr XQueryErrorText<> attributeIsXMLNS{44, "Attribute namesapce is xmlns"};
 inline constexpr XQueryErrorText<> invalidNamespace{70, "invalid namespace declaration"};
 inline constexpr XQueryErrorText<> invalidComment{72, "invalid comment"};
+
+// --- function calls ------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<1> undefinedFunction{8, "function %@ not defined for context"};
+inline constexpr XQueryErrorText<1> invalidArguments{17, "invalid arguments to function - %@"};
+inline constexpr XQueryErrorText<2> namedError{0, "%@#%@"};
+inline constexpr XQueryErrorText<3> describedError{0, "%@#%@ - %@"};
+inline constexpr XQueryErrorText<> notZeroOrOne{
+    6, "fn:zero-or-one called with a sequence containing more than one item"};
+inline constexpr XQueryErrorText<> notOneOrMore{
+    6, "fn:one-or-more called with a sequence containing zero items"};
+inline constexpr XQueryErrorText<> notExactlyOne{
+    6, "fn:exactly-one called with a sequence containing zero or more than one item"};
 
 }  // namespace XQueryErrors
 }  // namespace xquery

@@ -5,6 +5,7 @@
 #include "Expr/XQueryNameTest.h"
 #include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQueryPath.h"
+#include "Functions/XQueryFunctionCall.h"
 #include "Parser/Builders.h"
 #include "Parser/ParserText.h"
 #include "Parser/XQueryParser.h"
@@ -24,11 +25,6 @@ Ref<XQueryParsedModule> module(std::string_view query) {
       << query << "\n"
       << (parser->errors().empty() ? "" : parser->errors()[0]->msg()->utf8());
   return parser->parsedModule();
-}
-
-const XQueryParser* parserOf(std::string_view query, Ref<XQueryParser>& keep) {
-  keep = XQueryParser::parserWithSource(NSString::stringWithUTF8(query));
-  return keep.get();
 }
 
 // Writes an expression in a form that shows its tree.
@@ -86,6 +82,13 @@ std::string shape(const XQueryExpr* expr) {
     return cast<NSNumber>(literal->literalValue())->stringValue();
   }
   if (isa<XQueryContextItem>(expr)) return ".";
+  if (const auto* call = dyn_cast<XQueryFunctionCall>(expr)) {
+    std::string result = call->name()->utf8() + "(";
+    for (size_t index = 0; call->args() && index < call->args()->count(); ++index) {
+      result += (index ? "; " : "") + shape(call->args()->objectAtIndex(index));
+    }
+    return result + ")";
+  }
   if (isa<XQueryVariable>(expr)) return "$";
   return "?";
 }
@@ -136,6 +139,18 @@ TEST(Builders, VariablesAndTheContextItem) {
 }
 
 // --- operators ---------------------------------------------------------------------------------
+
+TEST(Builders, CallsKeepTheirNameAndTheirArguments) {
+  EXPECT_EQ(bodyShape("f()"), "f()");
+  EXPECT_EQ(bodyShape("p:f(1)"), "p:f(1)");
+  EXPECT_EQ(bodyShape("f(1, (2, 3), (), $x)"), "f(1; {2,3}; (); $)");
+  EXPECT_EQ(bodyShape("f(g(1, 2), h())"), "f(g(1; 2); h())");
+}
+
+TEST(Builders, ACallWithoutArgumentsHasNoList) {
+  const auto result = module("f()");
+  EXPECT_FALSE(cast<XQueryFunctionCall>(onlyExpr(*result))->args());
+}
 
 TEST(Builders, EveryOperatorHasItsCode) {
   const struct {
@@ -535,26 +550,6 @@ TEST_F(BuilderText, CharsGrowOneString) {
   NSObject* text = XQChars(u'a');
   EXPECT_EQ(XQCharsAdd(text, 0xD83D), text);
   EXPECT_EQ(cast<XQueryParserText>(text)->string()->view().utf16(), (std::u16string{u'a', 0xD83D}));
-}
-
-// --- what cannot be compiled ---------------------------------------------------------------------
-
-TEST(Builders, ConstructsThatCannotBeCompiledAreNamed) {
-  const struct {
-    const char* query;
-    const char* construct;
-  } rows[] = {
-      {"f(1, 2)", "function calls"},
-  };
-  for (const auto& row : rows) {
-    Ref<XQueryParser> keep;
-    const XQueryParser* parser = parserOf(row.query, keep);
-    ASSERT_EQ(parser->errors().size(), 1u) << row.query;
-    EXPECT_EQ(parser->errors()[0]->err(), 0);
-    EXPECT_EQ(parser->errors()[0]->msg()->utf8(),
-              std::string(row.construct) + " are not available in this build");
-    EXPECT_EQ(shape(parser->parsedModule()->body().get()), "()") << row.query;
-  }
 }
 
 }  // namespace

@@ -234,26 +234,6 @@ TEST(Parser, AnUnknownSetterFlagIsIgnored) {
   EXPECT_TRUE(parser->errors().empty());
 }
 
-// --- what cannot be compiled ---------------------------------------------------------------------
-
-TEST(Parser, OneConstructThatCannotBeCompiledIsReported) {
-  EXPECT_EQ(errorsOf("1,\n2,\nf(1, g(2)),\nh()"),
-            Strings{"XQueryError:0 - \"function calls are not available in this build\" "
-                    "at line:3"});
-}
-
-TEST(Parser, TheConstructOnTheLowestLineIsReported) {
-  EXPECT_EQ(errorsOf("f(\ng()\n)"),
-            Strings{"XQueryError:0 - \"function calls are not available in this build\" "
-                    "at line:1"});
-}
-
-TEST(Parser, SyntaxErrorsComeBeforeWhatCannotBeCompiled) {
-  EXPECT_EQ(errorsOf("<a/>, 1 = 2 = 3"),
-            Strings{"XQueryError:3 - \"parse error invalid token (=)- <a/>, 1 = 2 = 3\" "
-                    "at line:1"});
-}
-
 // --- input -------------------------------------------------------------------------------------
 
 TEST(Parser, HandsOutItsSourceInPieces) {

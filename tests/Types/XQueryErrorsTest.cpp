@@ -24,7 +24,6 @@ const Row rows[] = {
     row(XQueryErrors::outOfMemory, 0, "limit: out of memory"),
     row(XQueryErrors::tooManyDigits, 0, "limit: number of too many digits"),
     row(XQueryErrors::rangeTooLong, 0, "limit: range of too many items"),
-    row(XQueryErrors::unavailableConstruct, 0, "%@ are not available in this build"),
     row(XQueryErrors::unresolvedQName, 1, "can't resolve QName for \"%@\""),
     row(XQueryErrors::notUTF8, 3, "the query is not well-formed UTF-8"),
     row(XQueryErrors::scannerError, 3, "%@ - %@"),
@@ -83,6 +82,16 @@ const Row rows[] = {
     row(XQueryErrors::secondEmptyOrdering, 69,
         "Prolog contains more than one empty ordering declaration"),
     row(XQueryErrors::reservedPrefix, 70, "prefix %@ can't be redeclared"),
+    row(XQueryErrors::undefinedFunction, 8, "function %@ not defined for context"),
+    row(XQueryErrors::invalidArguments, 17, "invalid arguments to function - %@"),
+    row(XQueryErrors::namedError, 0, "%@#%@"),
+    row(XQueryErrors::describedError, 0, "%@#%@ - %@"),
+    row(XQueryErrors::notZeroOrOne, 6,
+        "fn:zero-or-one called with a sequence containing more than one item"),
+    row(XQueryErrors::notOneOrMore, 6,
+        "fn:one-or-more called with a sequence containing zero items"),
+    row(XQueryErrors::notExactlyOne, 6,
+        "fn:exactly-one called with a sequence containing zero or more than one item"),
 };
 
 TEST(ErrorCatalogue, EveryRowHasItsNumberAndText) {

@@ -1,0 +1,15 @@
+// Functions that ask for the focus and the static context.
+#pragma once
+
+#include "xquery/Object.h"
+
+#include <cstddef>
+
+namespace xquery {
+
+class XQueryContext;
+
+Value fn_position(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_last(const Value* arguments, size_t count, XQueryContext& context);
+
+}  // namespace xquery

@@ -1,0 +1,105 @@
+#include "Functions/FunctionsNode.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQuerySequence.h"
+#include "Types/XQueryAtomization.h"
+#include "Types/XQueryCasting.h"
+#include "Types/XQueryNodeFunctions.h"
+#include "Types/XQueryNumber.h"
+
+namespace xquery {
+namespace {
+
+// The only argument, or the context item without one. Null when there is neither, and for more
+// arguments than one.
+Value argumentOrContextItem(const Value* arguments, size_t count, XQueryContext& context) {
+  if (count > 1) return Value();
+  return count == 1 ? arguments[0] : context._internal().contextItem();
+}
+
+Value asString(Ref<NSString> text, XQueryContext& context) {
+  return XQueryCastAsTypeForContext(text ? text : NSString::empty(), XQueryTypeString, context);
+}
+
+// A name of the item as a string: "" for the empty sequence and for a node without that name, null
+// for what is no node.
+template <class NameOf>
+Value nameAsString(const Value& item, NameOf nameOf, XQueryContext& context) {
+  if (isNull(item)) return asString(NSString::empty(), context);
+  const auto* node = dyn_cast<NSXMLNode>(item.get());
+  return node ? asString(nameOf(node), context) : Value();
+}
+
+// The values of a sequence; null when one of its members is neither a node nor atomic.
+Value typedMembers(const NSArray& members) {
+  XQueryGatherer values;
+  for (const Value& member : members.objects()) {
+    if (isNull(member)) continue;
+    if (const auto* node = dyn_cast<NSXMLNode>(member.get())) {
+      values.add(XQueryNodeTypedValue(node));
+    } else if (XQueryIsAtomicType(member.get())) {
+      values.add(member);
+    } else {
+      return Value();
+    }
+  }
+  return values.value();
+}
+
+}  // namespace
+
+Value fn_string(const Value* arguments, size_t count, XQueryContext& context) {
+  const Value item = argumentOrContextItem(arguments, count, context);
+  if (!item) return Value();
+  if (isNull(item)) return asString(NSString::empty(), context);
+  if (const auto* node = dyn_cast<NSXMLNode>(item.get())) {
+    return asString(XQueryNodeStringValue(node), context);
+  }
+  return XQueryCastAsTypeForContext(item, XQueryTypeString, context);
+}
+
+Value fn_data(const Value* arguments, size_t count, XQueryContext&) {
+  if (count != 1) return Value();
+  const Value& value = arguments[0];
+  if (isNull(value)) return value;
+  if (const auto* members = dyn_cast<NSArray>(value.get())) return typedMembers(*members);
+  if (const auto* node = dyn_cast<NSXMLNode>(value.get())) return XQueryNodeTypedValue(node);
+  return XQueryIsAtomicType(value.get()) ? value : Value();
+}
+
+// What does not cast to a double is NaN.
+Value fn_number(const Value* arguments, size_t count, XQueryContext& context) {
+  const Value argument = argumentOrContextItem(arguments, count, context);
+  if (!argument) return Value();
+  const Value item =
+      XQueryAtomizationCheckingOccurrence(argument, XQueryOccurrenceAnyAlso, context);
+  if (isNull(item)) return XQueryNumber::nan();
+  auto& dynamic = context._internal();
+  try {
+    return XQueryCastAsTypeForContext(item, XQueryTypeDouble, context);
+  } catch (const NSException&) {
+    if (XQueryIsLimit(dynamic.error().get())) throw;
+    dynamic.setError(nullptr, false);
+    return XQueryNumber::nan();
+  }
+}
+
+Value fn_name(const Value* arguments, size_t count, XQueryContext& context) {
+  return nameAsString(argumentOrContextItem(arguments, count, context), XQueryNodeName, context);
+}
+
+Value fn_local_name(const Value* arguments, size_t count, XQueryContext& context) {
+  return nameAsString(
+      argumentOrContextItem(arguments, count, context),
+      [](const NSXMLNode* node) { return node->localName(); }, context);
+}
+
+// The topmost ancestor, or the node itself.
+Value fn_root(const Value* arguments, size_t count, XQueryContext& context) {
+  const Value item = argumentOrContextItem(arguments, count, context);
+  if (!item || isNull(item)) return item;
+  const auto* node = dyn_cast<NSXMLNode>(item.get());
+  return node ? Value(XQueryNodeRoot(node)) : Value();
+}
+
+}  // namespace xquery

@@ -1,0 +1,19 @@
+// Functions about nodes and the values of nodes.
+#pragma once
+
+#include "xquery/Object.h"
+
+#include <cstddef>
+
+namespace xquery {
+
+class XQueryContext;
+
+Value fn_string(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_data(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_number(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_name(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_local_name(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_root(const Value* arguments, size_t count, XQueryContext& context);
+
+}  // namespace xquery

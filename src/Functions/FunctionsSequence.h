@@ -1,0 +1,20 @@
+// Functions over sequences of any items.
+#pragma once
+
+#include "xquery/Object.h"
+
+#include <cstddef>
+
+namespace xquery {
+
+class XQueryContext;
+
+Value fn_empty(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_exists(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_count(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_zero_or_one(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_one_or_more(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_exactly_one(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_distinct_values(const Value* arguments, size_t count, XQueryContext& context);
+
+}  // namespace xquery

@@ -1,0 +1,238 @@
+#include "Functions/XQueryBuiltInFunction.h"
+
+#include "Functions/FunctionsAggregate.h"
+#include "Functions/FunctionsBoolean.h"
+#include "Functions/FunctionsConstructors.h"
+#include "Functions/FunctionsContext.h"
+#include "Functions/FunctionsError.h"
+#include "Functions/FunctionsNode.h"
+#include "Functions/FunctionsSequence.h"
+#include "Functions/FunctionsString.h"
+
+#include <array>
+#include <new>
+#include <unordered_map>
+
+namespace xquery {
+namespace {
+
+constexpr auto FN = XQueryNamespaceFN;
+constexpr auto XS = XQueryNamespaceXS;
+constexpr auto XDT = XQueryNamespaceXDT;
+constexpr auto EXT = XQueryNamespaceExt;
+
+// A row without a procedure is a name that the engine knows and has no answer for.
+constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
+    {FN, "node-name", nullptr},
+    {FN, "nilled", nullptr},
+    {FN, "string", fn_string},
+    {FN, "data", fn_data},
+    {FN, "base-uri", nullptr},
+    {FN, "static-base-uri", nullptr},
+    {FN, "document-uri", nullptr},
+    {FN, "error", fn_error},
+    {FN, "trace", fn_trace},
+    {FN, "codepoints-to-string", nullptr},
+    {FN, "string-to-codepoints", nullptr},
+    {FN, "compare", nullptr},
+    {FN, "concat", fn_concat},
+    {FN, "string-join", nullptr},
+    {FN, "starts-with", nullptr},
+    {FN, "ends-with", nullptr},
+    {FN, "contains", nullptr},
+    {FN, "substring", nullptr},
+    {FN, "string-length", nullptr},
+    {FN, "substring-before", nullptr},
+    {FN, "substring-after", nullptr},
+    {FN, "normalize-space", nullptr},
+    {FN, "normalize-unicode", nullptr},
+    {FN, "upper-case", nullptr},
+    {FN, "lower-case", nullptr},
+    {FN, "translate", nullptr},
+    {FN, "escape-uri", nullptr},
+    {FN, "matches", nullptr},
+    {FN, "replace", nullptr},
+    {FN, "tokenize", nullptr},
+    {FN, "true", fn_true},
+    {FN, "false", fn_false},
+    {FN, "not", fn_not},
+    {FN, "abs", nullptr},
+    {FN, "floor", nullptr},
+    {FN, "ceiling", nullptr},
+    {FN, "round", nullptr},
+    {FN, "round-half-to-even", nullptr},
+    {FN, "resolve-QName", nullptr},
+    {FN, "QName", nullptr},
+    {FN, "local-name-from-QName", nullptr},
+    {FN, "namespace-uri-from-QName", nullptr},
+    {FN, "namespace-uri-for-prefix", nullptr},
+    {FN, "in-scope-prefixes", nullptr},
+    {FN, "resolve-uri", nullptr},
+    {FN, "name", fn_name},
+    {FN, "local-name", fn_local_name},
+    {FN, "namespace-uri", nullptr},
+    {FN, "number", fn_number},
+    {FN, "lang", nullptr},
+    {FN, "root", fn_root},
+    {FN, "zero-or-one", fn_zero_or_one},
+    {FN, "one-or-more", fn_one_or_more},
+    {FN, "exactly-one", fn_exactly_one},
+    {FN, "boolean", fn_boolean},
+    {FN, "index-of", nullptr},
+    {FN, "empty", fn_empty},
+    {FN, "exists", fn_exists},
+    {FN, "distinct-values", fn_distinct_values},
+    {FN, "insert-before", nullptr},
+    {FN, "remove", nullptr},
+    {FN, "reverse", nullptr},
+    {FN, "subsequence", nullptr},
+    {FN, "unordered", nullptr},
+    {FN, "deep-equal", nullptr},
+    {FN, "count", fn_count},
+    {FN, "avg", nullptr},
+    {FN, "max", nullptr},
+    {FN, "min", nullptr},
+    {FN, "sum", fn_sum},
+    {FN, "id", nullptr},
+    {FN, "idref", nullptr},
+    {FN, "doc", nullptr},
+    {FN, "collection", nullptr},
+    {FN, "position", fn_position},
+    {FN, "last", fn_last},
+    {FN, "years-from-duration", nullptr},
+    {FN, "months-from-duration", nullptr},
+    {FN, "days-from-duration", nullptr},
+    {FN, "hours-from-duration", nullptr},
+    {FN, "minutes-from-duration", nullptr},
+    {FN, "seconds-from-duration", nullptr},
+    {FN, "year-from-dateTime", nullptr},
+    {FN, "month-from-dateTime", nullptr},
+    {FN, "day-from-dateTime", nullptr},
+    {FN, "hours-from-dateTime", nullptr},
+    {FN, "minutes-from-dateTime", nullptr},
+    {FN, "seconds-from-dateTime", nullptr},
+    {FN, "timezone-from-dateTime", nullptr},
+    {FN, "year-from-date", nullptr},
+    {FN, "month-from-date", nullptr},
+    {FN, "day-from-date", nullptr},
+    {FN, "timezone-from-date", nullptr},
+    {FN, "hours-from-time", nullptr},
+    {FN, "minutes-from-time", nullptr},
+    {FN, "seconds-from-time", nullptr},
+    {FN, "timezone-from-time", nullptr},
+    {FN, "adjust-dateTime-to-timezone", nullptr},
+    {FN, "adjust-date-to-timezone", nullptr},
+    {FN, "adjust-time-to-timezone", nullptr},
+    {FN, "subtract-dateTimes-yielding-dayTimeDuration", nullptr},
+    {FN, "subtract-dates-yielding-dayTimeDuration", nullptr},
+    {FN, "subtract-times", nullptr},
+    {FN, "current-date", nullptr},
+    {FN, "current-dateTime", nullptr},
+    {FN, "current-time", nullptr},
+    {FN, "dateTime", nullptr},
+    {FN, "implicit-timezone", nullptr},
+    {FN, "default-collation", nullptr},
+    {XS, "string", xs_string},
+    {XS, "boolean", xs_boolean},
+    {XS, "decimal", xs_decimal},
+    {XS, "float", xs_float},
+    {XS, "double", xs_double},
+    {XS, "duration", xs_duration},
+    {XS, "dateTime", xs_dateTime},
+    {XS, "time", xs_time},
+    {XS, "date", xs_date},
+    {XS, "gYearMonth", xs_gYearMonth},
+    {XS, "gYear", xs_gYear},
+    {XS, "gMonthDay", xs_gMonthDay},
+    {XS, "gDay", xs_gDay},
+    {XS, "gMonth", xs_gMonth},
+    {XS, "hexBinary", xs_hexBinary},
+    {XS, "base64Binary", xs_base64Binary},
+    {XS, "anyURI", xs_anyURI},
+    {XS, "QName", xs_QName},
+    {XS, "normalizedString", xs_normalizedString},
+    {XS, "token", xs_token},
+    {XS, "language", xs_language},
+    {XS, "NMTOKEN", xs_NMTOKEN},
+    {XS, "Name", xs_Name},
+    {XS, "NCName", xs_NCName},
+    {XS, "ID", xs_ID},
+    {XS, "IDREF", xs_IDREF},
+    {XS, "ENTITY", xs_ENTITY},
+    {XS, "integer", xs_integer},
+    {XS, "nonPositiveInteger", xs_nonPositiveInteger},
+    {XS, "negativeInteger", xs_negativeInteger},
+    {XS, "long", xs_long},
+    {XS, "int", xs_int},
+    {XS, "short", xs_short},
+    {XS, "byte", xs_byte},
+    {XS, "nonNegativeInteger", xs_nonNegativeInteger},
+    {XS, "unsignedLong", xs_unsignedLong},
+    {XS, "unsignedInt", xs_unsignedInt},
+    {XS, "unsignedShort", xs_unsignedShort},
+    {XS, "unsignedByte", xs_unsignedByte},
+    {XS, "positiveInteger", xs_positiveInteger},
+    {XS, "NOTATION", xs_NOTATION},
+    {XDT, "yearMonthDuration", xdt_yearMonthDuration},
+    {XDT, "dayTimeDuration", xdt_dayTimeDuration},
+    {XDT, "untypedAtomic", xdt_untypedAtomic},
+    {EXT, "_test", nullptr},
+    {EXT, "eval", nullptr},
+    {EXT, "string-from-node", nullptr},
+    {EXT, "node-from-string", nullptr},
+    {EXT, "binary-from-string", nullptr},
+    {EXT, "string-from-binary", nullptr},
+    {EXT, "binary-hex-to-base64", nullptr},
+    {EXT, "binary-base64-to-hex", nullptr},
+    {EXT, "binary-length", nullptr},
+    {EXT, "binary-insert", nullptr},
+    {EXT, "binary-remove", nullptr},
+    {EXT, "binary-find", nullptr},
+    {EXT, "binary-find-all", nullptr},
+    {EXT, "real-date-time", nullptr},
+    {EXT, "uri-body", nullptr},
+    {EXT, "xslt", nullptr},
+    {EXT, "xslt-uri", nullptr},
+    {EXT, "node-xquery", nullptr},
+    {EXT, "node-xpath", nullptr},
+    {EXT, "xpath-for-node", nullptr},
+});
+
+Value noAnswer(const Value*, size_t, XQueryContext&) {
+  return Value();
+}
+
+using Registry = std::unordered_map<Ref<XQueryQName>, Ref<XQueryBuiltInFunction>, XQueryQNameHash,
+                                    XQueryQNameEqual>;
+
+Registry* makeRegistry() {
+  // Never destroyed: queries may be compiled by destructors that run at exit.
+  alignas(Registry) static unsigned char storage[sizeof(Registry)];
+  auto* registry = ::new (storage) Registry;
+  registry->reserve(table.size());
+  for (const auto& row : table) {
+    const Ref<NSString> URI = XQueryModules::builtinNamespaceForID(row.namespaceID);
+    registry->emplace(
+        XQueryQName::qname(NSString::stringWithASCII(row.localName), URI),
+        XQueryBuiltInFunction::builtInFunctionWithProc(row.proc ? row.proc : noAnswer));
+  }
+  return registry;
+}
+
+}  // namespace
+
+Ref<XQueryBuiltInFunction> XQueryBuiltInFunction::builtInFunctionWithProc(XQueryProcedure proc) {
+  return make<XQueryBuiltInFunction>(proc);
+}
+
+XQueryProcedure XQueryBuiltInFunction::functionForQName(const Ref<XQueryQName>& qName) {
+  static const Registry* const registry = makeRegistry();
+  const auto found = registry->find(qName);
+  return found == registry->end() ? nullptr : found->second->proc();
+}
+
+std::span<const XQueryBuiltInFunction::Registration> XQueryBuiltInFunction::registrations() {
+  return table;
+}
+
+}  // namespace xquery

@@ -1,0 +1,53 @@
+// The registry of built-in functions.
+//
+// It is keyed by name alone and knows nothing of argument counts: every procedure checks its own.
+#pragma once
+
+#include "Prolog/XQueryModules.h"
+#include "Types/XQueryQName.h"
+#include "xquery/Object.h"
+
+#include <cstddef>
+#include <span>
+#include <string_view>
+
+namespace xquery {
+
+class XQueryContext;
+
+// Evaluated arguments (a null pointer for none), their number, and the context. No argument is
+// null, and none is an array of fewer than two elements. The answer is
+//   a value         an item, an array (of any number of items) or NSNull
+//   an XQueryError  a failure, which the call raises
+//   null            wrong arguments: a wrong number of them, or of a kind that cannot be used
+using XQueryProcedure = Value (*)(const Value* arguments, size_t count, XQueryContext& context);
+
+class XQueryBuiltInFunction : public NSCounted {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::BuiltInFunction; }
+
+  [[nodiscard]] static Ref<XQueryBuiltInFunction> builtInFunctionWithProc(XQueryProcedure proc);
+  XQueryProcedure proc() const { return _proc; }
+
+  // Null for a name that is not registered.
+  static XQueryProcedure functionForQName(const Ref<XQueryQName>& qName);
+
+  struct Registration {
+    XQueryNamespaceID namespaceID;
+    std::string_view localName;
+    XQueryProcedure proc;  // null: every call fails as one with wrong arguments
+  };
+  // Every built-in function, in the order of registration.
+  static std::span<const Registration> registrations();
+
+ protected:
+  explicit XQueryBuiltInFunction(XQueryProcedure initWithProc)
+      : NSCounted(Kind::BuiltInFunction), _proc(initWithProc) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  XQueryProcedure _proc;
+};
+
+}  // namespace xquery

@@ -1,0 +1,145 @@
+#include "Functions/XQueryFunctionCall.h"
+
+#include "Eval/StackGuard.h"
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQuerySequence.h"
+#include "Prolog/XQueryDeclarations.h"
+#include "Prolog/XQueryProlog.h"
+#include "Types/XQueryErrors.h"
+
+#include <vector>
+
+namespace xquery {
+namespace {
+
+// Puts the caller's local variables aside for a frame of the callee's, and back on every way out.
+// An exception that passes needs no catching for that: unwinding a deep recursion stays linear.
+class CalleeFrame {
+ public:
+  CalleeFrame(XQueryContextInternal& context, XQueryFrameRef frame)
+      : _context(context), _other(std::move(frame)) {
+    _context._exchangeInScopeVariables(_other);
+  }
+  CalleeFrame(const CalleeFrame&) = delete;
+  CalleeFrame& operator=(const CalleeFrame&) = delete;
+  ~CalleeFrame() { _context._exchangeInScopeVariables(_other); }
+
+ private:
+  XQueryContextInternal& _context;
+  XQueryFrameRef _other;
+};
+
+// The same for the active prolog and its ordering mode.
+class CalleeProlog {
+ public:
+  CalleeProlog(XQueryContextInternal& context, XQueryProlog& prolog)
+      : _context(context), _prolog(context.activeProlog()), _ordered(context.ordered()) {
+    _context.setActiveProlog(&prolog);
+    _context.setOrdered(prolog.ordered());
+  }
+  CalleeProlog(const CalleeProlog&) = delete;
+  CalleeProlog& operator=(const CalleeProlog&) = delete;
+  ~CalleeProlog() {
+    _context.setActiveProlog(_prolog);
+    _context.setOrdered(_ordered);
+  }
+
+ private:
+  XQueryContextInternal& _context;
+  XQueryProlog* _prolog;
+  bool _ordered;
+};
+
+// Calls with more arguments than this allocate the argument vector.
+constexpr size_t bufferSlots = 3;
+
+}  // namespace
+
+Ref<XQueryFunctionCall> XQueryFunctionCall::functionCallWithName(Ref<NSString> name,
+                                                                 Ref<XQueryArgs> withArgs) {
+  return make<XQueryFunctionCall>(std::move(name), std::move(withArgs));
+}
+
+void XQueryFunctionCall::bindInfoForProlog(XQueryProlog& prolog) {
+  if (const auto qName = prolog.functionQNameFromString(_name)) {
+    _function = XQueryBuiltInFunction::functionForQName(qName);
+    if (!_function) _functionDecl = prolog.functionInfoForSignature({qName, argumentCount()});
+  }
+  if (_args) _args->bindInfoForProlog(prolog);
+}
+
+Value XQueryFunctionCall::evaluateWithContext(XQueryContext& context) const {
+  XQueryCheckStack(context);
+  if (_functionDecl) return callDeclared(context);
+  if (_function) return callBuiltIn(context);
+  evaluateArguments(context);
+  raiseUndefined(context);
+}
+
+// For calls that fail whatever the arguments are, once these have been evaluated.
+void XQueryFunctionCall::evaluateArguments(XQueryContext& context) const {
+  for (size_t index = 0; index < argumentCount(); ++index) argument(index, context);
+}
+
+Value XQueryFunctionCall::callDeclared(XQueryContext& context) const {
+  auto& dynamic = context._internal();
+  const auto& params = _functionDecl->params();
+  if (params.size() != argumentCount()) {
+    evaluateArguments(context);
+    raiseInvalidArguments(context);
+  }
+  // An external function was never bound to anything.
+  if (_functionDecl->isExternal()) {
+    evaluateArguments(context);
+    raiseUndefined(context);
+  }
+  // The arguments go straight into the callee's frame, which is not in force yet.
+  XQueryFrameRef frame = params.empty() ? XQueryFrameRef() : make<XQueryFrame>();
+  for (size_t index = 0; index < params.size(); ++index) {
+    Value value = argument(index, context);
+    if (const int64_t varID = params[index]->varID()) frame->setValue(std::move(value), varID);
+  }
+  const CalleeFrame calleeFrame(dynamic, std::move(frame));
+  const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
+  Value result = _functionDecl->expr()->evaluateWithContext(context);
+  if (!result) raiseUndefined(context);
+  if (auto* error = dyn_cast<XQueryError>(result)) dynamic.raise(error);
+  return result;
+}
+
+Value XQueryFunctionCall::callBuiltIn(XQueryContext& context) const {
+  const size_t count = argumentCount();
+  if (count <= bufferSlots) {
+    Value arguments[bufferSlots];
+    return callBuiltIn(count == 0 ? nullptr : arguments, count, context);
+  }
+  std::vector<Value> arguments(count);
+  return callBuiltIn(arguments.data(), count, context);
+}
+
+Value XQueryFunctionCall::callBuiltIn(Value* arguments, size_t count,
+                                      XQueryContext& context) const {
+  bool isComplete = true;
+  for (size_t index = 0; index < count; ++index) {
+    arguments[index] = normalised(argument(index, context));
+    isComplete = isComplete && arguments[index];
+  }
+  // An argument without a value, as "." is without a focus, is none that a function could use.
+  if (!isComplete) raiseInvalidArguments(context);
+  auto& dynamic = context._internal();
+  const CalleeFrame calleeFrame(dynamic, nullptr);
+  Value result = normalised(_function(arguments, count, context));
+  if (!result) raiseInvalidArguments(context);
+  if (auto* error = dyn_cast<XQueryError>(result)) dynamic.raise(error);
+  return result;
+}
+
+void XQueryFunctionCall::raiseUndefined(XQueryContext& context) const {
+  context._internal().raise(XQueryErrors::undefinedFunction.errorAtLine(exprLine(), _name));
+}
+
+void XQueryFunctionCall::raiseInvalidArguments(XQueryContext& context) const {
+  context._internal().raise(XQueryErrors::invalidArguments.errorAtLine(exprLine(), _name));
+}
+
+}  // namespace xquery

@@ -1,0 +1,63 @@
+// A call of a built-in or a declared function.
+#pragma once
+
+#include "Expr/XQueryExpr.h"
+#include "Expr/XQueryLists.h"
+#include "Functions/XQueryBuiltInFunction.h"
+
+namespace xquery {
+
+class XQueryFunctionDecl;
+
+class XQueryFunctionCall : public XQueryExpr {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::FunctionCall; }
+
+  // The name as written, prefix included; null arguments are none.
+  [[nodiscard]] static Ref<XQueryFunctionCall> functionCallWithName(Ref<NSString> name,
+                                                                    Ref<XQueryArgs> withArgs);
+
+  const Ref<NSString>& name() const { return _name; }
+  XQueryArgs* args() const { return _args.get(); }
+  // What binding found: a procedure, a declaration (owned by its prolog), or neither.
+  XQueryProcedure function() const { return _function; }
+  XQueryFunctionDecl* functionDecl() const { return _functionDecl; }
+
+  // A built-in function wins over a declared one of the same name, whatever the number of
+  // arguments. A name that cannot be resolved is no error before the call is evaluated.
+  void bindInfoForProlog(XQueryProlog& prolog) override;
+
+  // Evaluates the arguments and calls. The callee sees none of the caller's local variables; of a
+  // declared function the body is evaluated in the static context of the prolog that declared it.
+  // Argument values are handed over as they are: declared types are not applied.
+  //   error 8   function ... not defined for context   nothing was found, or it gave no value
+  //   error 17  invalid arguments to function - ...    the built-in function refused its arguments
+  // An error that the function answers is raised.
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  XQueryFunctionCall(Ref<NSString> name, Ref<XQueryArgs> args)
+      : XQueryExpr(Kind::FunctionCall), _name(std::move(name)), _args(std::move(args)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  size_t argumentCount() const { return _args ? _args->count() : 0; }
+  Value argument(size_t index, XQueryContext& context) const {
+    return _args->objectAtIndex(index)->evaluateWithContext(context);
+  }
+  void evaluateArguments(XQueryContext& context) const;
+  Value callDeclared(XQueryContext& context) const;
+  Value callBuiltIn(XQueryContext& context) const;
+  Value callBuiltIn(Value* arguments, size_t count, XQueryContext& context) const;
+  // Out of line: what they need of the stack is no part of a recursion's frames.
+  [[noreturn, gnu::noinline]] void raiseUndefined(XQueryContext& context) const;
+  [[noreturn, gnu::noinline]] void raiseInvalidArguments(XQueryContext& context) const;
+
+  Ref<NSString> _name;
+  Ref<XQueryArgs> _args;
+  XQueryProcedure _function = nullptr;
+  XQueryFunctionDecl* _functionDecl = nullptr;
+};
+
+}  // namespace xquery

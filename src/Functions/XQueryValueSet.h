@@ -1,0 +1,62 @@
+// A set of atomic values under the values' own equality (XQueryObjectsEqual).
+//
+// That equality is no equivalence: two integers beyond the precision of a double differ although
+// both equal the same double. The set answers exactly what comparing with every value in it one by
+// one would answer, because each part of it holds values among which equality is one:
+//
+//   strings      equal by text, and equal to nothing that is no string
+//   exact        integers, decimals and booleans, equal among each other by exact value
+//   floating     doubles and floats, by their value as a double
+//   exactDoubles the values in `exact` as doubles: what a floating number is compared with, and
+//                filled only once there is one. An exact number meets floating ones as a double
+//                too.
+//   others       every other class, equal only within itself
+//
+// Hashing exact numbers by their digits, not as doubles, also keeps a million integers that share
+// one double from landing in one bucket.
+#pragma once
+
+#include "xquery/Number.h"
+#include "xquery/Object.h"
+#include "xquery/String.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <unordered_set>
+
+namespace xquery {
+
+class XQueryValueSet {
+ public:
+  // Adds the value; false when an equal one is there already. The value must outlive the set.
+  bool insert(const NSObject& value);
+
+ private:
+  struct TextHash {
+    size_t operator()(NSStringView text) const { return text.hash(); }
+  };
+  struct ExactHash {
+    size_t operator()(const NSDecimal& value) const;
+  };
+  struct ExactEqual {
+    bool operator()(const NSDecimal& a, const NSDecimal& b) const { return a.compare(b) == 0; }
+  };
+  struct ValueHash {
+    size_t operator()(const NSObject* value) const;
+  };
+  struct ValueEqual {
+    bool operator()(const NSObject* a, const NSObject* b) const;
+  };
+
+  bool insertNumber(const NSNumber& number);
+  bool insertFloating(double value);
+  bool insertExact(NSDecimal value);
+
+  std::unordered_set<NSStringView, TextHash> _strings;
+  std::unordered_set<NSDecimal, ExactHash, ExactEqual> _exact;
+  std::unordered_set<uint64_t> _floating;      // doubles by their bits
+  std::unordered_set<uint64_t> _exactDoubles;  // complete once `_floating` holds anything
+  std::unordered_set<const NSObject*, ValueHash, ValueEqual> _others;
+};
+
+}  // namespace xquery

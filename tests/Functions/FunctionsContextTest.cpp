@@ -1,0 +1,58 @@
+#include "Functions/FunctionsContext.h"
+#include "Functions/FunctionsTesting.h"
+
+namespace xquery {
+namespace {
+
+using namespace functiontest;
+
+std::string inFocus(XQueryProcedure procedure, int64_t position, int64_t last) {
+  return outcome([&](XQueryContext& context) {
+    context._internal().setContextItem(integer(7), position);
+    context._internal().setLast(last);
+    return procedure(nullptr, 0, context);
+  });
+}
+
+TEST(Position, IsThePlaceInTheFocus) {
+  EXPECT_EQ(inFocus(fn_position, 3, 5), "integer 3");
+}
+
+TEST(Position, OfZeroIsRefused) {
+  EXPECT_EQ(inFocus(fn_position, 0, 5), "null");
+  EXPECT_EQ(call(fn_position, {}), "null");
+}
+
+TEST(Last, IsTheSizeOfTheFocus) {
+  EXPECT_EQ(inFocus(fn_last, 3, 5), "integer 5");
+}
+
+TEST(Last, OfZeroIsRefused) {
+  EXPECT_EQ(inFocus(fn_last, 3, 0), "null");
+  EXPECT_EQ(call(fn_last, {}), "null");
+}
+
+TEST(PositionAndLast, TakeNoArguments) {
+  EXPECT_EQ(outcome([](XQueryContext& context) {
+              context._internal().setContextItem(integer(7), 1);
+              context._internal().setLast(1);
+              const Value argument = integer(1);
+              EXPECT_FALSE(fn_position(&argument, 1, context));
+              return fn_last(&argument, 1, context);
+            }),
+            "null");
+}
+
+TEST(Last, WithoutASizeFailsTheCall) {
+  EXPECT_EQ(answer("last()"), "error 17 line 1 invalid arguments to function - last");
+  EXPECT_EQ(answer("position()"), "error 17 line 1 invalid arguments to function - position");
+}
+
+TEST(Position, OfTheContextItemOfTheWholeQueryIsOne) {
+  EXPECT_EQ(answer("position()", document("<a/>")), "integer 1");
+  EXPECT_EQ(answer("last()", document("<a/>")),
+            "error 17 line 1 invalid arguments to function - last");
+}
+
+}  // namespace
+}  // namespace xquery

@@ -1,0 +1,160 @@
+#include "Functions/FunctionsTesting.h"
+#include "Functions/XQueryBuiltInFunction.h"
+
+#include <algorithm>
+#include <set>
+#include <sstream>
+
+namespace xquery {
+namespace {
+
+using functiontest::answer;
+
+constexpr std::string_view standardNames =
+    "node-name nilled string data base-uri static-base-uri document-uri error trace "
+    "codepoints-to-string string-to-codepoints compare concat string-join starts-with ends-with "
+    "contains substring string-length substring-before substring-after normalize-space "
+    "normalize-unicode upper-case lower-case translate escape-uri matches replace tokenize true "
+    "false not abs floor ceiling round round-half-to-even resolve-QName QName "
+    "local-name-from-QName namespace-uri-from-QName namespace-uri-for-prefix in-scope-prefixes "
+    "resolve-uri name local-name namespace-uri number lang root zero-or-one one-or-more "
+    "exactly-one boolean index-of empty exists distinct-values insert-before remove reverse "
+    "subsequence unordered deep-equal count avg max min sum id idref doc collection position last "
+    "years-from-duration months-from-duration days-from-duration hours-from-duration "
+    "minutes-from-duration seconds-from-duration year-from-dateTime month-from-dateTime "
+    "day-from-dateTime hours-from-dateTime minutes-from-dateTime seconds-from-dateTime "
+    "timezone-from-dateTime year-from-date month-from-date day-from-date timezone-from-date "
+    "hours-from-time minutes-from-time seconds-from-time timezone-from-time "
+    "adjust-dateTime-to-timezone adjust-date-to-timezone adjust-time-to-timezone "
+    "subtract-dateTimes-yielding-dayTimeDuration subtract-dates-yielding-dayTimeDuration "
+    "subtract-times current-date current-dateTime current-time dateTime implicit-timezone "
+    "default-collation";
+constexpr std::string_view schemaNames =
+    "string boolean decimal float double duration dateTime time date gYearMonth gYear gMonthDay "
+    "gDay gMonth hexBinary base64Binary anyURI QName normalizedString token language NMTOKEN Name "
+    "NCName ID IDREF ENTITY integer nonPositiveInteger negativeInteger long int short byte "
+    "nonNegativeInteger unsignedLong unsignedInt unsignedShort unsignedByte positiveInteger "
+    "NOTATION";
+constexpr std::string_view datatypeNames = "yearMonthDuration dayTimeDuration untypedAtomic";
+constexpr std::string_view extensionNames =
+    "_test eval string-from-node node-from-string binary-from-string string-from-binary "
+    "binary-hex-to-base64 binary-base64-to-hex binary-length binary-insert binary-remove "
+    "binary-find binary-find-all real-date-time uri-body xslt xslt-uri node-xquery node-xpath "
+    "xpath-for-node";
+
+constexpr std::string_view standardURI = "http://www.w3.org/2004/10/xpath-functions";
+constexpr std::string_view schemaURI = "http://www.w3.org/2001/XMLSchema";
+constexpr std::string_view datatypeURI = "http://www.w3.org/2004/10/xpath-datatypes";
+constexpr std::string_view extensionURI = "http://libxquery.example/xquery/2004/10/functions";
+
+std::vector<std::string> words(std::string_view text) {
+  std::istringstream in{std::string(text)};
+  std::vector<std::string> result;
+  for (std::string word; in >> word;) result.push_back(word);
+  return result;
+}
+
+std::vector<std::string> registeredNames(XQueryNamespaceID namespaceID) {
+  std::vector<std::string> names;
+  for (const auto& row : XQueryBuiltInFunction::registrations()) {
+    if (row.namespaceID == namespaceID) names.emplace_back(row.localName);
+  }
+  return names;
+}
+
+XQueryProcedure procedureNamed(std::string_view localName, std::string_view URI) {
+  const Ref<NSString> namespaceURI = URI.empty() ? nullptr : NSString::stringWithASCII(URI);
+  return XQueryBuiltInFunction::functionForQName(
+      XQueryQName::qname(NSString::stringWithASCII(localName), namespaceURI));
+}
+
+TEST(Registry, HoldsEveryFunctionOfEachNamespaceInOrder) {
+  EXPECT_EQ(registeredNames(XQueryNamespaceFN), words(standardNames));
+  EXPECT_EQ(registeredNames(XQueryNamespaceXS), words(schemaNames));
+  EXPECT_EQ(registeredNames(XQueryNamespaceXDT), words(datatypeNames));
+  EXPECT_EQ(registeredNames(XQueryNamespaceExt), words(extensionNames));
+}
+
+TEST(Registry, CountsPerNamespaceAddUp) {
+  EXPECT_EQ(words(standardNames).size(), 109U);
+  EXPECT_EQ(words(schemaNames).size(), 41U);
+  EXPECT_EQ(words(datatypeNames).size(), 3U);
+  EXPECT_EQ(words(extensionNames).size(), 20U);
+  EXPECT_EQ(XQueryBuiltInFunction::registrations().size(), 173U);
+}
+
+TEST(Registry, StandardThenSchemaThenDatatypeThenExtensionFunctions) {
+  const auto rows = XQueryBuiltInFunction::registrations();
+  const XQueryNamespaceID order[] = {XQueryNamespaceFN, XQueryNamespaceXS, XQueryNamespaceXDT,
+                                     XQueryNamespaceExt};
+  const auto place = [&](XQueryNamespaceID id) {
+    return std::find(std::begin(order), std::end(order), id) - std::begin(order);
+  };
+  EXPECT_TRUE(std::is_sorted(rows.begin(), rows.end(), [&](const auto& a, const auto& b) {
+    return place(a.namespaceID) < place(b.namespaceID);
+  }));
+}
+
+TEST(Registry, EveryNameIsFoundInItsNamespaceOnly) {
+  const struct {
+    std::string_view names;
+    std::string_view URI;
+  } families[] = {{standardNames, standardURI},
+                  {schemaNames, schemaURI},
+                  {datatypeNames, datatypeURI},
+                  {extensionNames, extensionURI}};
+  for (const auto& family : families) {
+    for (const std::string& name : words(family.names)) {
+      EXPECT_TRUE(procedureNamed(name, family.URI)) << name;
+      EXPECT_FALSE(procedureNamed(name, "")) << name;
+      EXPECT_FALSE(procedureNamed(name, "http://www.w3.org/2004/10/xquery-local-functions"))
+          << name;
+    }
+  }
+}
+
+TEST(Registry, UnknownNamesHaveNoProcedure) {
+  EXPECT_FALSE(procedureNamed("counts", standardURI));
+  EXPECT_FALSE(procedureNamed("Count", standardURI));
+  EXPECT_FALSE(procedureNamed("count", schemaURI));
+  EXPECT_FALSE(procedureNamed("IDREFS", schemaURI));
+  EXPECT_FALSE(procedureNamed("anyAtomicType", datatypeURI));
+}
+
+TEST(Registry, ThePrefixOfANameDoesNotMatter) {
+  const Ref<NSString> URI = NSString::stringWithASCII(standardURI);
+  EXPECT_EQ(XQueryBuiltInFunction::functionForQName(
+                XQueryQName::qname(NSString::stringWithASCII("p:count"), URI)),
+            procedureNamed("count", standardURI));
+}
+
+TEST(Registry, FunctionsWithAProcedureOfTheirOwnDoNotShareIt) {
+  std::set<XQueryProcedure> procedures;
+  size_t count = 0;
+  for (const auto& row : XQueryBuiltInFunction::registrations()) {
+    if (!row.proc) continue;
+    ++count;
+    procedures.insert(row.proc);
+  }
+  EXPECT_EQ(procedures.size(), count);
+}
+
+TEST(Registry, AFunctionWithoutProcedureFailsAsWithWrongArguments) {
+  for (const auto& row : XQueryBuiltInFunction::registrations()) {
+    if (row.proc) continue;
+    const std::string prefix = row.namespaceID == XQueryNamespaceExt ? "ext:" : "fn:";
+    const std::string name = prefix + std::string(row.localName);
+    for (const char* arguments : {"()", "(1)", "('a', 'b')", "(1, 2, 3, 4)"}) {
+      EXPECT_EQ(answer(name + arguments),
+                "error 17 line 1 invalid arguments to function - " + name);
+    }
+  }
+}
+
+TEST(BuiltInFunction, KeepsItsProcedure) {
+  const XQueryProcedure procedure = procedureNamed("count", standardURI);
+  EXPECT_EQ(XQueryBuiltInFunction::builtInFunctionWithProc(procedure)->proc(), procedure);
+}
+
+}  // namespace
+}  // namespace xquery

@@ -1,0 +1,117 @@
+#include "Functions/FunctionsTesting.h"
+#include "Functions/XQueryValueSet.h"
+
+#include <chrono>
+#include <random>
+
+namespace xquery {
+namespace {
+
+using namespace functiontest;
+
+// The rule itself: a value is new when it equals none of those kept.
+class PlainValueSet {
+ public:
+  bool insert(const NSObject& value) {
+    for (const NSObject* kept : _kept) {
+      if (XQueryObjectsEqual(*kept, value)) return false;
+    }
+    _kept.push_back(&value);
+    return true;
+  }
+
+ private:
+  std::vector<const NSObject*> _kept;
+};
+
+// Values that are equal, nearly equal, or equal only as doubles.
+std::vector<Value> somewhatAlike() {
+  std::vector<Value> values = {nan(),
+                               infinity(),
+                               minusInfinity(),
+                               boolean(true),
+                               boolean(false),
+                               number(-0.0),
+                               number(0.1),
+                               single("0.1"),
+                               decimal("0.1"),
+                               decimal("0.10000000149011612"),
+                               decimal("0.1000000000000000055511151231257827"),
+                               typed(XQueryTypeUnsignedLong, "18446744073709551615"),
+                               number(18446744073709551616.0),
+                               typed(XQueryTypeQName, "a"),
+                               typed(XQueryTypeAnyURI, "urn:a"),
+                               typed(XQueryTypeAnyURI, "1"),
+                               typed(XQueryTypeHexBinary, "61"),
+                               typed(XQueryTypeBase64Binary, "YQ=="),
+                               typed(XQueryTypeNotation, "a"),
+                               months(1),
+                               seconds(1),
+                               typed(XQueryTypeFloat, "INF"),
+                               NSNumber::numberWithLongLong(2),
+                               NSNumber::numberWithDouble(2)};
+  constexpr int64_t beyondDouble = int64_t{1} << 53;
+  for (int64_t offset = -3; offset <= 3; ++offset) {
+    values.push_back(integer(offset));
+    values.push_back(integer(beyondDouble + offset));
+    values.push_back(decimal(std::to_string(beyondDouble + offset) + ".25"));
+    values.push_back(number(static_cast<double>(beyondDouble + offset)));
+    values.push_back(number(static_cast<double>(offset)));
+    values.push_back(single(std::to_string(offset)));
+    values.push_back(typed(XQueryTypeLong, std::to_string(offset)));
+    values.push_back(decimal("1" + std::string(40, '0') + std::to_string(offset + 3)));
+    values.push_back(string(std::to_string(offset)));
+    values.push_back(untyped(std::to_string(offset)));
+    values.push_back(typed(XQueryTypeToken, std::to_string(offset)));
+  }
+  return values;
+}
+
+TEST(ValueSet, AnswersWhatComparingWithEveryKeptValueAnswers) {
+  const std::vector<Value> pool = somewhatAlike();
+  std::mt19937 random(20041029);
+  for (int round = 0; round < 3000; ++round) {
+    XQueryValueSet set;
+    PlainValueSet plain;
+    std::string history;
+    const size_t count = 1 + random() % 60;
+    for (size_t index = 0; index < count; ++index) {
+      const Value& value = pool[random() % pool.size()];
+      history += show(value) + ", ";
+      ASSERT_EQ(set.insert(*value), plain.insert(*value)) << history;
+    }
+  }
+}
+
+TEST(ValueSet, TheAnswerDependsOnTheOrderWhereEqualityDoes) {
+  const Value low = integer((int64_t{1} << 53) + 1);
+  const Value exact = integer(int64_t{1} << 53);
+  const Value floating = number(9007199254740992.0);
+  XQueryValueSet exactFirst;
+  EXPECT_TRUE(exactFirst.insert(*low));
+  EXPECT_TRUE(exactFirst.insert(*exact));
+  EXPECT_FALSE(exactFirst.insert(*floating));
+  XQueryValueSet floatingFirst;
+  EXPECT_TRUE(floatingFirst.insert(*floating));
+  EXPECT_FALSE(floatingFirst.insert(*low));
+  EXPECT_FALSE(floatingFirst.insert(*exact));
+}
+
+// Numbers that share one double must not make each insertion look at all the others.
+TEST(ValueSet, ManyIntegersOfOneDoubleStayFast) {
+  constexpr size_t count = 20000;
+  std::vector<Value> values;
+  for (size_t index = 0; index < count; ++index) {
+    const std::string digits = std::to_string(count + index);
+    values.push_back(decimal("1" + std::string(40, '0') + digits));
+  }
+  const auto start = std::chrono::steady_clock::now();
+  XQueryValueSet set;
+  for (const Value& value : values) EXPECT_TRUE(set.insert(*value));
+  EXPECT_FALSE(set.insert(*values.back()));
+  // Every pair compared would take many times as long.
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5));
+}
+
+}  // namespace
+}  // namespace xquery
