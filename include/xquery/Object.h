@@ -49,6 +49,7 @@ enum class Kind : uint8_t {
   URL,
   Data,
   Date,
+  TypedDate,  // XQueryDate
   Duration,
   QName,
   Notation,
@@ -70,6 +71,7 @@ enum class Kind : uint8_t {
   ParsedModule,
   ParserText,
   URLHandle,
+  TimeZone,
   PathResults,
   Frame,  // XQueryFrame
   BuiltInFunction,

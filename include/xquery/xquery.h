@@ -3,6 +3,7 @@
 
 #include "xquery/Collection.h"
 #include "xquery/Data.h"
+#include "xquery/Date.h"
 #include "xquery/Error.h"
 #include "xquery/Loading.h"
 #include "xquery/Number.h"

@@ -3,6 +3,7 @@
 #include "Platform/NSLog.h"
 #include "Platform/XMLTree.h"
 #include "Prolog/XQueryProlog.h"
+#include "Types/XQueryDate.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "xquery/Collection.h"
 
@@ -127,6 +128,11 @@ Ref<NSString> XQueryContextInternal::baseURIForNode(const NSXMLNode* node) const
   Ref<NSString> own = XQueryNodeBaseURI(node);
   if ((own && own->length() > 0) || _baseURINodeCount == 0) return own;
   return NSXMLTree::recordedBaseURI(node, _baseURIOwner);
+}
+
+const Ref<XQueryDate>& XQueryContextInternal::currentDateTime() {
+  if (!_currentDateTime) _currentDateTime = XQueryDate::currentDateTime();
+  return _currentDateTime;
 }
 
 void XQueryContextInternal::setError(Ref<XQueryError> error, bool raiseException) {

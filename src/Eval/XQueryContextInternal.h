@@ -18,6 +18,7 @@
 
 namespace xquery {
 
+class XQueryDate;
 class XQueryProlog;
 
 // Whether the error says that a limit of the engine was reached. Such an error ends the evaluation
@@ -110,6 +111,9 @@ class XQueryContextInternal {
   // For code that always raises.
   [[noreturn]] void raise(Ref<XQueryError> error);
 
+  // The present of the first call, a dateTime; the same object at every later call.
+  const Ref<XQueryDate>& currentDateTime();
+
   std::shared_ptr<XQueryClient> client() const { return _client; }
   void setClient(std::shared_ptr<XQueryClient> client) { _client = std::move(client); }
 
@@ -130,6 +134,7 @@ class XQueryContextInternal {
   NSURLTable<Value> _documentCache;  // documents, NSNull for failures
   NSURLTable<Ref<NSURLHandle>> _URLCache;
   Ref<XQueryError> _error;
+  Ref<XQueryDate> _currentDateTime;
   XQueryProlog* _prolog = nullptr;
   std::shared_ptr<XQueryClient> _client;
   Value _contextItem;

@@ -4,6 +4,7 @@
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
+#include "Types/XQueryDateArithmetic.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
@@ -246,25 +247,78 @@ bool op_numeric_greater_than(const NSNumber& a, const NSNumber& b) {
 
 namespace {
 
-// What a row of the dispatch table asks of an operand.
+// What a row of the dispatch table asks of an operand: to be numeric, or of exactly one type.
 bool isNumeric(XQueryTypeID type) {
   return XQueryIsNumericTypeID(type);
+}
+
+template <XQueryTypeID wanted>
+bool is(XQueryTypeID type) {
+  return type == wanted;
+}
+
+constexpr auto isDateTime = is<XQueryTypeDateTime>;
+constexpr auto isDate = is<XQueryTypeDate>;
+constexpr auto isTime = is<XQueryTypeTime>;
+constexpr auto isMonths = is<XQueryTypeYearMonthDuration>;
+constexpr auto isSeconds = is<XQueryTypeDayTimeDuration>;
+
+using Work = Value (*)(const Value&, const Value&, XQueryContext&);
+
+// The same with the operands in the other order.
+template <Work work>
+Value swapped(const Value& a, const Value& b, XQueryContext& context) {
+  return work(b, a, context);
 }
 
 struct Row {
   int type;
   bool (*left)(XQueryTypeID);
   bool (*right)(XQueryTypeID);
-  Value (*work)(const Value&, const Value&, XQueryContext&);
+  Work work;
 };
 
-constexpr std::array rows = {
-    Row{XQueryOperatorPlus, isNumeric, isNumeric, op_numeric_add},
-    Row{XQueryOperatorMinus, isNumeric, isNumeric, op_numeric_subtract},
-    Row{XQueryOperatorMultiply, isNumeric, isNumeric, op_numeric_multiply},
-    Row{XQueryOperatorDiv, isNumeric, isNumeric, op_numeric_divide},
-    Row{XQueryOperatorIDiv, isNumeric, isNumeric, op_numeric_integer_divide},
-    Row{XQueryOperatorMod, isNumeric, isNumeric, op_numeric_mod},
+constexpr Row rows[] = {
+    {XQueryOperatorPlus, isNumeric, isNumeric, op_numeric_add},
+    {XQueryOperatorMinus, isNumeric, isNumeric, op_numeric_subtract},
+    {XQueryOperatorMultiply, isNumeric, isNumeric, op_numeric_multiply},
+    {XQueryOperatorDiv, isNumeric, isNumeric, op_numeric_divide},
+    {XQueryOperatorIDiv, isNumeric, isNumeric, op_numeric_integer_divide},
+    {XQueryOperatorMod, isNumeric, isNumeric, op_numeric_mod},
+
+    {XQueryOperatorPlus, isDateTime, isSeconds, op_add_dayTimeDuration_to_dateTime},
+    {XQueryOperatorPlus, isDateTime, isMonths, op_add_yearMonthDuration_to_dateTime},
+    {XQueryOperatorPlus, isDate, isSeconds, op_add_dayTimeDuration_to_date},
+    {XQueryOperatorPlus, isDate, isMonths, op_add_yearMonthDuration_to_date},
+    {XQueryOperatorPlus, isTime, isSeconds, op_add_dayTimeDuration_to_time},
+    {XQueryOperatorPlus, isSeconds, isDateTime, swapped<op_add_dayTimeDuration_to_dateTime>},
+    {XQueryOperatorPlus, isMonths, isDateTime, swapped<op_add_yearMonthDuration_to_dateTime>},
+    {XQueryOperatorPlus, isSeconds, isDate, swapped<op_add_dayTimeDuration_to_date>},
+    {XQueryOperatorPlus, isMonths, isDate, swapped<op_add_yearMonthDuration_to_date>},
+    {XQueryOperatorPlus, isSeconds, isTime, swapped<op_add_dayTimeDuration_to_time>},
+    {XQueryOperatorPlus, isMonths, isMonths, op_add_yearMonthDurations},
+    {XQueryOperatorPlus, isSeconds, isSeconds, op_add_dayTimeDurations},
+
+    {XQueryOperatorMinus, isDateTime, isMonths, op_subtract_yearMonthDuration_from_dateTime},
+    {XQueryOperatorMinus, isDateTime, isSeconds, op_subtract_dayTimeDuration_from_dateTime},
+    {XQueryOperatorMinus, isDate, isMonths, op_subtract_yearMonthDuration_from_date},
+    {XQueryOperatorMinus, isDate, isSeconds, op_subtract_dayTimeDuration_from_date},
+    {XQueryOperatorMinus, isTime, isSeconds, op_subtract_dayTimeDuration_from_time},
+    {XQueryOperatorMinus, isDateTime, isDateTime, op_subtract_dates},
+    {XQueryOperatorMinus, isDate, isDate, op_subtract_dates},
+    {XQueryOperatorMinus, isTime, isTime, op_subtract_dates},
+    {XQueryOperatorMinus, isMonths, isMonths, op_subtract_yearMonthDurations},
+    {XQueryOperatorMinus, isSeconds, isSeconds, op_subtract_dayTimeDurations},
+
+    {XQueryOperatorMultiply, isMonths, isNumeric, op_multiply_yearMonthDuration},
+    {XQueryOperatorMultiply, isSeconds, isNumeric, op_multiply_dayTimeDuration},
+    {XQueryOperatorMultiply, isNumeric, isMonths, swapped<op_multiply_yearMonthDuration>},
+    {XQueryOperatorMultiply, isNumeric, isSeconds, swapped<op_multiply_dayTimeDuration>},
+
+    {XQueryOperatorDiv, isMonths, isNumeric, op_divide_yearMonthDuration},
+    {XQueryOperatorDiv, isSeconds, isNumeric, op_divide_dayTimeDuration},
+    {XQueryOperatorDiv, isMonths, isMonths, op_divide_durations},
+    {XQueryOperatorDiv, isSeconds, isSeconds, op_divide_durations},
 };
 
 // A node becomes its untyped value, and an untyped value a number.
@@ -274,10 +328,20 @@ Value asNumberIfUntyped(const Value& operand, XQueryTypeID numberType, XQueryCon
   return XQueryCastAsTypeForContext(atomic, numberType, context);
 }
 
-// idiv has no answer for a zero divisor whatever the type; mod has one in floating point.
+bool isOrderedDuration(const Value& value) {
+  return XQueryIsKindOfType(XQueryObjectTypeID(value.get()), XQueryTypeDuration) &&
+         isa<NSNumber>(value);
+}
+
+// idiv has no answer for a zero divisor whatever the type; mod has one in floating point. A
+// duration has none either.
 bool dividesByZero(int type, const Value& left, const Value& right) {
   const auto* divisor = dyn_cast<NSNumber>(right.get());
   if (!divisor || divisor->compare(*XQueryNumber::zero()) != 0) return false;
+  if (type == XQueryOperatorDiv && isOrderedDuration(left)) {
+    return !isOrderedDuration(right) ||
+           XQueryObjectTypeID(left.get()) == XQueryObjectTypeID(right.get());
+  }
   const XQueryTypeID common = commonType(left, right);
   if (common == XQueryTypeNone) return false;
   return type == XQueryOperatorIDiv || (type == XQueryOperatorMod && isExact(common));

@@ -7,6 +7,7 @@
 #include "Expr/XQueryUntypedText.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
+#include "Types/XQueryDate.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"
 #include "xquery/Collection.h"
@@ -131,6 +132,14 @@ Value ordering(Test test, const Value& a, const Value& b, XQueryTypeID primitive
       if (eitherIsNaN(left, right)) return truth(false);
       return truth(test == Test::Less ? op_numeric_less_than(left, right)
                                       : op_numeric_greater_than(left, right));
+    }
+    // Any of the eight types may stand on the right: instants are compared.
+    case XQueryTypeDateTime:
+    case XQueryTypeDate:
+    case XQueryTypeTime: {
+      if (!isa<XQueryDate>(b)) return Value();
+      const auto order = cast<XQueryDate>(a)->instant() <=> cast<XQueryDate>(b)->instant();
+      return truth(test == Test::Less ? order < 0 : order > 0);
     }
     case XQueryTypeDuration: {
       const int order = orderOfDurations(a.get(), b.get());

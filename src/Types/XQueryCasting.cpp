@@ -7,6 +7,8 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryBinary.h"
+#include "Types/XQueryDate.h"
+#include "Types/XQueryDuration.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNotation.h"
 #include "Types/XQueryNumber.h"
@@ -57,10 +59,6 @@ Value toStringFamily(const Cast& cast) {
 
 Value textToTarget(const Cast& cast) {
   return XQueryCastAs(plainString(*XQueryStringValue(*cast.object)), cast.target, cast.context);
-}
-
-Value toMissingType(const Cast& cast) {
-  cast.context._internal().raise(XQueryErrors::unavailableType.error());
 }
 
 // --- from strings --------------------------------------------------------------------------------
@@ -153,6 +151,11 @@ Value stringToQName(const Cast& cast) {
   return XQueryQName::qname(name, URI);
 }
 
+template <Ref<XQueryDate> (*parse)(NSStringView)>
+Value stringToDate(const Cast& cast) {
+  return parse(cast.string().view());
+}
+
 Value stringToDuration(const Cast& cast) {
   if (cast.target == XQueryTypeYearMonthDuration) {
     return XQueryNumber::yearMonthDurationWithString(cast.string().view());
@@ -160,7 +163,7 @@ Value stringToDuration(const Cast& cast) {
   if (cast.target == XQueryTypeDayTimeDuration) {
     return XQueryNumber::dayTimeDurationWithString(cast.string().view());
   }
-  return toMissingType(cast);
+  return XQueryDuration::durationWithString(cast.string().view());
 }
 
 Value stringToBase64Binary(const Cast& cast) {
@@ -273,6 +276,18 @@ Value notationToNotation(const Cast& cast) {
   return XQueryNotation::notationWithString(XQueryStringValue(*cast.object));
 }
 
+Value dateToDate(const Cast& source) {
+  return cast<XQueryDate>(source.object)->castToType(source.target);
+}
+
+// By way of text, so that the texts' own rules hold.
+Value durationToOrderedDuration(const Cast& source) {
+  const XQueryDuration& duration = *cast<XQueryDuration>(source.object);
+  const bool isDayTime = source.target == XQueryTypeDayTimeDuration;
+  const std::string text = isDayTime ? duration.dayTimeText() : duration.yearMonthText();
+  return XQueryCastAs(NSString::stringWithASCII(text), source.target, source.context);
+}
+
 Value binaryToHexBinary(const Cast& source) {
   return XQueryHexBinary::binaryWithData(cast<XQueryBinary>(source.object)->data());
 }
@@ -288,6 +303,8 @@ enum class Source : uint8_t {
   Number,
   Boolean,
   OrderedDuration,  // a number that counts months or seconds
+  Date,             // any of the eight date and time types
+  Duration,
   AnyURI,
   QName,
   Notation,
@@ -313,14 +330,14 @@ constexpr CastRow castRows[] = {
     {Source::String, XQueryTypeDecimal, stringToDecimal},
     {Source::String, XQueryTypeAnyURI, stringToAnyURI},
     {Source::String, XQueryTypeQName, stringToQName},
-    {Source::String, XQueryTypeGYearMonth, toMissingType},
-    {Source::String, XQueryTypeGYear, toMissingType},
-    {Source::String, XQueryTypeGMonthDay, toMissingType},
-    {Source::String, XQueryTypeGDay, toMissingType},
-    {Source::String, XQueryTypeGMonth, toMissingType},
-    {Source::String, XQueryTypeDateTime, toMissingType},
-    {Source::String, XQueryTypeDate, toMissingType},
-    {Source::String, XQueryTypeTime, toMissingType},
+    {Source::String, XQueryTypeGYearMonth, stringToDate<XQueryDate::xqueryGMonthYearFromString>},
+    {Source::String, XQueryTypeGYear, stringToDate<XQueryDate::xqueryGYearFromString>},
+    {Source::String, XQueryTypeGMonthDay, stringToDate<XQueryDate::xqueryGMonthDayFromString>},
+    {Source::String, XQueryTypeGDay, stringToDate<XQueryDate::xqueryGDayFromString>},
+    {Source::String, XQueryTypeGMonth, stringToDate<XQueryDate::xqueryGMonthFromString>},
+    {Source::String, XQueryTypeDateTime, stringToDate<XQueryDate::xqueryDateTimeFromString>},
+    {Source::String, XQueryTypeDate, stringToDate<XQueryDate::xqueryDateFromString>},
+    {Source::String, XQueryTypeTime, stringToDate<XQueryDate::xqueryTimeFromString>},
     {Source::String, XQueryTypeDuration, stringToDuration},
     {Source::String, XQueryTypeBase64Binary, stringToBase64Binary},
     {Source::String, XQueryTypeHexBinary, stringToHexBinary},
@@ -343,6 +360,21 @@ constexpr CastRow castRows[] = {
     {Source::OrderedDuration, XQueryTypeUntypedAtomic, textToTarget},
     {Source::OrderedDuration, XQueryTypeString, textToTarget},
     {Source::OrderedDuration, XQueryTypeDuration, textToTarget},
+
+    {Source::Date, XQueryTypeUntypedAtomic, toUntypedAtomic},
+    {Source::Date, XQueryTypeString, toStringFamily},
+    {Source::Date, XQueryTypeGYearMonth, dateToDate},
+    {Source::Date, XQueryTypeGYear, dateToDate},
+    {Source::Date, XQueryTypeGMonthDay, dateToDate},
+    {Source::Date, XQueryTypeGDay, dateToDate},
+    {Source::Date, XQueryTypeGMonth, dateToDate},
+    {Source::Date, XQueryTypeDateTime, dateToDate},
+    {Source::Date, XQueryTypeDate, dateToDate},
+    {Source::Date, XQueryTypeTime, dateToDate},
+
+    {Source::Duration, XQueryTypeUntypedAtomic, toUntypedAtomic},
+    {Source::Duration, XQueryTypeString, toStringFamily},
+    {Source::Duration, XQueryTypeDuration, durationToOrderedDuration},
 
     {Source::AnyURI, XQueryTypeUntypedAtomic, toUntypedAtomic},
     {Source::AnyURI, XQueryTypeString, toStringFamily},
@@ -401,6 +433,10 @@ Source sourceOf(const NSObject* object) {
       return sourceOfNumber(*cast<NSNumber>(object));
     case Kind::URL:
       return Source::AnyURI;
+    case Kind::TypedDate:
+      return Source::Date;
+    case Kind::Duration:
+      return Source::Duration;
     case Kind::QName:
       return Source::QName;
     case Kind::Notation:

@@ -121,8 +121,6 @@ inline constexpr XQueryErrorText<1> notAString{6, "not a string type - %@"};
 inline constexpr XQueryErrorText<1> notANumber{6, "not a numeric type - %@"};
 inline constexpr XQueryErrorText<1> notAnInteger{6, "not a integer type - %@"};
 inline constexpr XQueryErrorText<> valueOfAnotherType{6, "value does not match a required type"};
-inline constexpr XQueryErrorText<> unavailableType{
-    6, "dates, times and durations are not available in this build"};
 
 // --- arithmetic ----------------------------------------------------------------------------------
 

@@ -1,8 +1,10 @@
 // Making typed numbers and printing them.
 #include "Types/XQueryNumber.h"
 
+#include "Types/DurationReader.h"
+#include "xquery/Date.h"
+
 #include <cmath>
-#include <ctime>
 #include <iterator>
 #include <limits>
 
@@ -105,44 +107,6 @@ std::string dayTimeText(double value) {
   return text;
 }
 
-// Reads the lexical forms of durations: letters as written, numbers of digits only.
-class DurationReader {
- public:
-  explicit DurationReader(NSStringView text) : _text(text) {}
-
-  bool take(char16_t letter) {
-    if (atEnd() || _text[_position] != letter) return false;
-    ++_position;
-    return true;
-  }
-  bool atEnd() const { return _position >= _text.length(); }
-  // At least one digit, kept as written.
-  bool digits(std::string& out) {
-    out.clear();
-    for (; !atEnd() && _text[_position] >= '0' && _text[_position] <= '9'; ++_position) {
-      out += static_cast<char>(_text[_position]);
-    }
-    return !out.empty();
-  }
-  // Fails on more than 64 bits hold.
-  bool integer(int64_t& out) {
-    std::string text;
-    if (!digits(text)) return false;
-    out = 0;
-    for (const char digit : text) {
-      if (__builtin_mul_overflow(out, int64_t{10}, &out) ||
-          __builtin_add_overflow(out, int64_t{digit - '0'}, &out)) {
-        return false;
-      }
-    }
-    return true;
-  }
-
- private:
-  NSStringView _text;
-  uint32_t _position = 0;
-};
-
 bool readMonths(DurationReader& reader, int64_t& months) {
   int64_t count = 0;
   months = 0;
@@ -153,18 +117,6 @@ bool readMonths(DurationReader& reader, int64_t& months) {
     if (!reader.integer(count)) return false;
   }
   return reader.take('M') && reader.atEnd() && !__builtin_add_overflow(months, count, &months);
-}
-
-// The seconds from "." on. The fraction is read as an integer, so that its leading zeros are lost:
-// 1.05 reads as 1.5.
-bool readFraction(DurationReader& reader, int64_t whole, double& seconds) {
-  std::string fraction;
-  if (!reader.digits(fraction) || !reader.take('S') || !reader.atEnd()) return false;
-  fraction.erase(0, std::min(fraction.find_first_not_of('0'), fraction.size() - 1));
-  double value = 0;
-  scanDouble(NSStringView::ascii(std::to_string(whole) + "." + fraction), value);
-  seconds += value;
-  return true;
 }
 
 bool readSeconds(DurationReader& reader, double& seconds) {
@@ -190,8 +142,9 @@ bool readSeconds(DurationReader& reader, double& seconds) {
     if (reader.atEnd()) return true;
     if (!reader.integer(count)) return false;
   }
-  if (reader.take('.')) return readFraction(reader, count, seconds);
-  seconds += static_cast<double>(count);
+  double rest = static_cast<double>(count);
+  if (reader.take('.') && !reader.fraction(count, rest)) return false;
+  seconds += rest;
   return reader.take('S') && reader.atEnd();
 }
 
@@ -356,10 +309,7 @@ Ref<XQueryNumber> XQueryNumber::dayTimeDurationWithString(NSStringView text) {
 }
 
 Ref<XQueryNumber> XQueryNumber::implicitTimeZone() {
-  const std::time_t now = std::time(nullptr);
-  std::tm local = {};
-  ::localtime_r(&now, &local);
-  return dayTimeDurationWithSeconds(static_cast<double>(local.tm_gmtoff));
+  return dayTimeDurationWithSeconds(NSTimeZone::localTimeZone()->secondsFromGMT(NSInstant::now()));
 }
 
 Ref<XQueryNumber> XQueryNumber::numberWithLongLong(int64_t value) {

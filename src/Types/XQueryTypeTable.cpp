@@ -6,6 +6,7 @@
 #include "Types/XQueryTypeTable.h"
 
 #include "Types/SafeNSArrayAdd.h"
+#include "Types/XQueryDate.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryQName.h"
 #include "Types/XQueryString.h"
@@ -211,6 +212,10 @@ XQueryTypeID XQueryObjectTypeID(const NSObject* object) {
       return XQueryTypeAnyURI;
     case Kind::QName:
       return XQueryTypeQName;
+    case Kind::TypedDate:
+      return cast<XQueryDate>(object)->typeID();
+    case Kind::Duration:
+      return XQueryTypeDuration;
     case Kind::Base64Binary:
       return XQueryTypeBase64Binary;
     case Kind::HexBinary:

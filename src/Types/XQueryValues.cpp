@@ -1,6 +1,8 @@
 #include "Types/XQueryValues.h"
 
 #include "Types/XQueryBinary.h"
+#include "Types/XQueryDate.h"
+#include "Types/XQueryDuration.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryNotation.h"
 #include "Types/XQueryNumber.h"
@@ -69,6 +71,10 @@ Ref<NSString> XQueryStringValue(const NSObject& object) {
       return cast<XQueryQName>(&object)->XQueryStringValue();
     case Kind::Notation:
       return cast<XQueryNotation>(&object)->XQueryStringValue();
+    case Kind::TypedDate:
+      return cast<XQueryDate>(&object)->XQueryStringValue();
+    case Kind::Duration:
+      return cast<XQueryDuration>(&object)->XQueryStringValue();
     case Kind::HexBinary:
       return cast<XQueryHexBinary>(&object)->XQueryStringValue();
     case Kind::Base64Binary:
@@ -94,6 +100,11 @@ bool XQueryObjectsEqual(const NSObject& a, const NSObject& b) {
     const NSNumber* other = dyn_cast<NSNumber>(&b);
     return other && number->isEqualToNumber(*other);
   }
+  // Dates are equal as instants, whatever their types and zones.
+  if (const NSDate* date = dyn_cast<NSDate>(&a)) {
+    const NSDate* other = dyn_cast<NSDate>(&b);
+    return other && date->isEqualToDate(*other);
+  }
   if (a.kind() != b.kind()) return false;
   switch (a.kind()) {
     case Kind::URL:
@@ -108,6 +119,7 @@ bool XQueryObjectsEqual(const NSObject& a, const NSObject& b) {
     case Kind::Data:
       return cast<NSData>(&a)->isEqualToData(*cast<NSData>(&b));
     default:
+      // Also of a general duration: it has no equality but being the same object.
       return false;
   }
 }
@@ -130,6 +142,9 @@ uint32_t XQueryObjectHash(const NSObject& object) {
     case Kind::HexBinary:
     case Kind::Base64Binary:
       return cast<XQueryBinary>(&object)->hash();
+    case Kind::Date:
+    case Kind::TypedDate:
+      return cast<NSDate>(&object)->hash();
     case Kind::Data:
       return static_cast<uint32_t>(std::hash<std::string_view>()(cast<NSData>(&object)->bytes()));
     default:

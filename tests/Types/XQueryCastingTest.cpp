@@ -225,14 +225,6 @@ TEST_F(Casting, OnlyAPlainXSStringCastsToNotation) {
   EXPECT_EQ(outcome(XQueryString::tokenWithString(*text("a")), 27), "mismatch");
 }
 
-TEST_F(Casting, TheDateFamilyIsReportedAsMissing) {
-  for (XQueryTypeID type = 16; type <= 24; ++type) {
-    EXPECT_EQ(outcome(text("P1Y"), type),
-              "6 dates, times and durations are not available in this build")
-        << type;
-  }
-}
-
 class CastingToQName : public Casting {
  protected:
   void SetUp() override {

@@ -1,10 +1,9 @@
+#include "Platform/ZoneTestSupport.h"
 #include "Types/XQueryNumber.h"
 
 #include <gtest/gtest.h>
 
 #include <cmath>
-#include <cstdlib>
-#include <ctime>
 #include <limits>
 #include <string>
 
@@ -452,20 +451,14 @@ TEST(XQueryNumber, PrintedDurationsParseToTheSameValue) {
   }
 }
 
-TEST(XQueryNumber, ImplicitTimeZoneIsTheLocalOffset) {
-  const char* before = std::getenv("TZ");
-  const std::string saved = before ? before : "";
-  ::setenv("TZ", "XYZ-5:30", 1);
-  ::tzset();
-  const Ref<XQueryNumber> zone = XQueryNumber::implicitTimeZone();
-  EXPECT_EQ(zone->typeID(), XQueryTypeDayTimeDuration);
-  EXPECT_EQ(zone->doubleValue(), 19800);
-  if (before) {
-    ::setenv("TZ", saved.c_str(), 1);
-  } else {
-    ::unsetenv("TZ");
-  }
-  ::tzset();
+class ImplicitTimeZone : public InZoneDeathTest {};
+
+TEST_F(ImplicitTimeZone, IsTheLocalOffset) {
+  EXPECT_EQ(XQueryNumber::implicitTimeZone()->typeID(), XQueryTypeDayTimeDuration);
+  const auto printed = [] { return XQueryNumber::implicitTimeZone()->XQueryStringValue()->utf8(); };
+  EXPECT_IN_ZONE("XYZ-5:30", printed(), "PT5H30M");
+  EXPECT_IN_ZONE("America/Bogota", printed(), "-PT5H");
+  EXPECT_IN_ZONE("UTC", printed(), "PT0S");
 }
 
 }  // namespace
