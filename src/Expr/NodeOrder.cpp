@@ -9,7 +9,9 @@
 //
 // That exception and the lack of an order between trees make the relation no total order, so the
 // sorts over several trees are merge sorts of our own: they stay within their array and keep what
-// cannot be compared in the order in which it stands, whatever the comparator answers.
+// cannot be compared in the order in which it stands, whatever the comparator answers. They look up
+// the tree and the number of each node once; climbing per comparison would multiply the depth of
+// the trees into the sort.
 #include "Expr/NodeOrder.h"
 
 #include "Expr/StableMergeSort.h"
@@ -78,6 +80,38 @@ bool allComparable(const std::vector<Value>& nodes) {
   return true;
 }
 
+// A node in a sort over several trees.
+struct Placed {
+  Value node;
+  const NSXMLNode* root = nullptr;
+  uint32_t number = 0;  // within the tree
+  size_t place = 0;     // where the node stood
+
+  bool isRoot() const { return node.get() == root; }
+};
+
+std::vector<Placed> placedNodes(std::vector<Value>& nodes) {
+  std::vector<Placed> placed;
+  placed.reserve(nodes.size());
+  const NSXMLNode* previous = nullptr;
+  for (Value& value : nodes) {
+    const NSXMLNode* node = nodeOf(value);
+    const bool inSameTree = previous && NSXMLNode::haveComparableOrder(previous, node);
+    const NSXMLNode* root = inSameTree ? placed.back().root : node->rootNode();
+    (void)NSXMLNode::haveComparableOrder(node, node);  // makes the number good
+    placed.push_back({std::move(value), root, node->orderNumber(), placed.size()});
+    previous = node;
+  }
+  return placed;
+}
+
+template <class Before>
+void sortSeveralTrees(std::vector<Value>& nodes, Before before) {
+  std::vector<Placed> placed = placedNodes(nodes);
+  stableMergeSort(placed, before);
+  for (size_t i = 0; i < nodes.size(); ++i) nodes[i] = std::move(placed[i].node);
+}
+
 void sortByOrderNumber(std::vector<Value>& nodes) {
   struct Numbered {
     uint32_t number;
@@ -143,47 +177,28 @@ int NodeDocOrderCompareReverse(const NSXMLNode* a, const NSXMLNode* b) {
 }
 
 void XQuerySortNodesForward(std::vector<Value>& nodes) {
-  if (allComparable(nodes)) {
-    sortByOrderNumber(nodes);
-  } else {
-    stableMergeSort(nodes, [](const Value& a, const Value& b) {
-      return NodeDocOrderCompareForward(nodeOf(a), nodeOf(b)) < 0;
-    });
-  }
+  if (allComparable(nodes)) return sortByOrderNumber(nodes);
+  sortSeveralTrees(nodes, [](const Placed& a, const Placed& b) {
+    return a.root == b.root ? a.number < b.number : a.isRoot() && !b.isRoot();
+  });
 }
 
 void XQuerySortNodesReverse(std::vector<Value>& nodes) {
   if (allComparable(nodes)) {
     sortByOrderNumber(nodes);
     std::reverse(nodes.begin(), nodes.end());
-  } else {
-    stableMergeSort(nodes, [](const Value& a, const Value& b) {
-      return NodeDocOrderCompareReverse(nodeOf(a), nodeOf(b)) < 0;
-    });
+    return;
   }
+  sortSeveralTrees(nodes, [](const Placed& a, const Placed& b) {
+    return a.root == b.root ? a.number > b.number : b.isRoot() && !a.isRoot();
+  });
 }
 
 void XQuerySortNodesForwardStable(std::vector<Value>& nodes) {
-  if (allComparable(nodes)) {
-    sortByOrderNumber(nodes);
-    return;
-  }
-  struct Placed {
-    Value node;
-    const NSXMLNode* root = nullptr;
-    size_t place = 0;
-  };
-  std::vector<Placed> placed;
-  placed.reserve(nodes.size());
-  for (Value& node : nodes) {
-    const NSXMLNode* root = nodeOf(node)->rootNode();
-    placed.push_back({std::move(node), root, placed.size()});
-  }
-  stableMergeSort(placed, [](const Placed& a, const Placed& b) {
-    if (a.root != b.root) return a.place < b.place;
-    return NodeDocOrderCompareForward(nodeOf(a.node), nodeOf(b.node)) < 0;
+  if (allComparable(nodes)) return sortByOrderNumber(nodes);
+  sortSeveralTrees(nodes, [](const Placed& a, const Placed& b) {
+    return a.root == b.root ? a.number < b.number : a.place < b.place;
   });
-  for (size_t i = 0; i < nodes.size(); ++i) nodes[i] = std::move(placed[i].node);
 }
 
 }  // namespace xquery

@@ -114,6 +114,54 @@ TEST_F(NodeOrder, StableSortingKeepsDocumentsInTheOrderInWhichTheyStand) {
   EXPECT_EQ(shownAll(nodes), "a s d t");
 }
 
+TEST_F(NodeOrder, SortingSeveralTreesPutsEachInItsOrderAndParentlessNodesBeforeAllOthers) {
+  const Value s = byID(other.get(), "s");
+  const Value t = byID(other.get(), "t");
+  std::vector<Value> nodes = {t, s, at("d"), at("a")};
+  XQuerySortNodesForward(nodes);
+  EXPECT_EQ(shownAll(nodes), "s t a d");
+  nodes = {s, t, at("a"), at("d")};
+  XQuerySortNodesReverse(nodes);
+  EXPECT_EQ(shownAll(nodes), "t s d a");
+  const Value lone = NSXMLElement::elementWithName(NSStringView::ascii("lone"));
+  nodes = {at("a"), lone, at("d")};
+  XQuerySortNodesForward(nodes);
+  EXPECT_EQ(shownAll(nodes), "lone a d");
+  XQuerySortNodesReverse(nodes);
+  EXPECT_EQ(shownAll(nodes), "d a lone");
+  XQuerySortNodesForwardStable(nodes);
+  EXPECT_EQ(shownAll(nodes), "a d lone");
+}
+
+TEST_F(NodeOrder, ParentlessNodesOfSeveralTreesKeepTheirOrder) {
+  std::vector<Value> nodes = {other, at("a"), document};
+  XQuerySortNodesForward(nodes);
+  ASSERT_EQ(nodes[0].get(), other.get());
+  ASSERT_EQ(nodes[1].get(), document.get());
+}
+
+TEST_F(NodeOrder, SortingDeepTreesCostsNoClimbPerComparison) {
+  constexpr int depth = 200000;
+  std::string xml;
+  for (int i = 0; i < depth; ++i) xml += "<a>";
+  for (int i = 0; i < depth; ++i) xml += "</a>";
+  const Ref<NSXMLDocument> documents[] = {parsed(xml), parsed(xml)};
+  std::vector<Value> expected;
+  for (const auto& deep : documents) {
+    for (NSXMLNode* node = deep->rootElement(); node; node = node->nextNode()) {
+      expected.push_back(node);
+    }
+  }
+  std::vector<Value> nodes = expected;
+  std::reverse(nodes.begin(), nodes.begin() + depth);
+  std::reverse(nodes.begin() + depth, nodes.end());
+  std::vector<Value> sorted = nodes;
+  XQuerySortNodesForward(sorted);
+  EXPECT_EQ(sorted, expected);
+  XQuerySortNodesForwardStable(nodes);
+  EXPECT_EQ(nodes, expected);
+}
+
 TEST_F(NodeOrder, SortingNodesOfSeveralTreesKeepsEveryNode) {
   std::vector<Ref<NSXMLDocument>> documents;
   std::vector<Value> nodes;
