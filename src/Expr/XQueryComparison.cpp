@@ -306,9 +306,10 @@ Value XQueryOperatorExpr::generalComparisonOperatorEvaluate(int type, const Valu
                                                             const Value& right,
                                                             XQueryContext& forContext) {
   // Most comparisons are of two single numbers, which need no conversion.
-  const int code = type + (XQueryOperatorEq - XQueryOperatorEqual);
-  if (Value answer = numberShortcut(XQueryRelationForCode(code), withLeft.get(), right.get())) {
-    return answer;
+  if (type >= XQueryOperatorEqual && type <= XQueryOperatorGreaterEqual) {
+    const int code = type + (XQueryOperatorEq - XQueryOperatorEqual);
+    Value answer = numberShortcut(XQueryRelationForCode(code), withLeft.get(), right.get());
+    if (answer) return answer;
   }
   if (Value answer = XQueryGeneralComparisonShortcut(type, withLeft, right, forContext)) {
     return answer;

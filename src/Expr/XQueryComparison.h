@@ -4,6 +4,8 @@
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Object.h"
 
+#include <cstdint>
+
 namespace xquery {
 
 class XQueryContext;
@@ -40,5 +42,7 @@ Value XQueryGeneralComparisonPlainly(int type, const Value& left, const Value& r
 Value XQueryValueComparisonShortcut(int type, const NSObject* left, const NSObject* right);
 Value XQueryGeneralComparisonShortcut(int type, const Value& left, const Value& right,
                                       XQueryContext& context);
+// A general comparison with all the integers from `first` to `last`, which are not made for it.
+Value XQueryGeneralComparisonWithRange(int type, const Value& left, int64_t first, int64_t last);
 
 }  // namespace xquery

@@ -11,7 +11,8 @@
 //                number (scanning is how it is cast, and a double is compared by double).
 //
 // When no pair can fail and there are many, not every pair has to be looked at: an order relation
-// is decided by the extremes of both sides, equality by a binary search.
+// is decided by the extremes of both sides, equality by a binary search. A range of integers is not
+// even made for that: an item is compared with its bounds.
 #include "Expr/XQueryArithmetic.h"
 #include "Expr/XQueryComparison.h"
 #include "Expr/XQueryOperatorExpr.h"
@@ -25,12 +26,19 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
+#include <limits>
 #include <optional>
 #include <utility>
 #include <vector>
 
 namespace xquery {
 namespace {
+
+constexpr int generalToValue = XQueryOperatorEq - XQueryOperatorEqual;
+
+bool isGeneralComparison(int type) {
+  return type >= XQueryOperatorEqual && type <= XQueryOperatorGreaterEqual;
+}
 
 enum class Answer : uint8_t { No, Yes, Unknown };
 
@@ -250,14 +258,51 @@ Answer compareManyPairs(XQueryRelation relation, Side& left, Side& right) {
                                [](Comparand& item) { return *item.asDouble(); });
 }
 
+// --- ranges --------------------------------------------------------------------------------------
+
+// Every integer up to this magnitude is a double, and compares with doubles as itself.
+constexpr int64_t exactIntegerBound = int64_t{1} << std::numeric_limits<double>::digits;
+
+bool isWhole(int64_t) {
+  return true;
+}
+bool isWhole(double value) {
+  return value == std::trunc(value);
+}
+
+// Whether the relation holds between the value and any integer from `first` to `last`.
+template <class Number>
+bool holdsForRange(XQueryRelation relation, Number value, int64_t first, int64_t last) {
+  const auto low = static_cast<Number>(first);
+  const auto high = static_cast<Number>(last);
+  switch (relation.test) {
+    case XQueryRelation::Equal:
+      if (relation.negated) return first != last || value != low;
+      return value >= low && value <= high && isWhole(value);
+    case XQueryRelation::Less:
+      return relation.negated ? value >= low : value < high;
+    case XQueryRelation::Greater:
+      return relation.negated ? value <= high : value > low;
+  }
+  return false;
+}
+
+Answer compareWithRange(XQueryRelation relation, Comparand& item, int64_t first, int64_t last) {
+  if (const auto value = item.asSmallInteger()) {
+    return answered(holdsForRange(relation, *value, first, last));
+  }
+  const bool isDouble = item.isUntyped() || item.type() == XQueryTypeDouble;
+  const std::optional<double> value = isDouble ? item.asDouble() : std::nullopt;
+  if (!value) return Answer::Unknown;
+  return answered(!std::isnan(*value) && holdsForRange(relation, *value, first, last));
+}
+
 }  // namespace
 
 Value XQueryGeneralComparisonShortcut(int type, const Value& left, const Value& right,
                                       XQueryContext& context) {
-  if (type < XQueryOperatorEqual || type > XQueryOperatorGreaterEqual || !left || !right) {
-    return Value();
-  }
-  const int code = type + (XQueryOperatorEq - XQueryOperatorEqual);
+  if (!isGeneralComparison(type) || !left || !right) return Value();
+  const int code = type + generalToValue;
   // Most operands are single items, which need no list.
   if (Comparand::isPossible(left.get()) && Comparand::isPossible(right.get())) {
     Comparand a(left.get());
@@ -277,6 +322,26 @@ Value XQueryGeneralComparisonShortcut(int type, const Value& left, const Value& 
       Value answer = comparePair(code, leftSide[i], rightSide[j], context);
       if (!(answer.get() == NSNumber::falseValue())) return answer;
     }
+  }
+  return NSNumber::falseValue();
+}
+
+Value XQueryGeneralComparisonWithRange(int type, const Value& left, int64_t first, int64_t last) {
+  if (!isGeneralComparison(type) || first < -exactIntegerBound || last > exactIntegerBound) {
+    return Value();
+  }
+  const XQueryRelation relation = XQueryRelationForCode(type + generalToValue);
+  const XQueryItemList items(left.get());
+  if (items.count() == 0) return Value();
+  // An item that cannot be atomized fails before any pair is looked at.
+  for (size_t i = 0; i < items.count(); ++i) {
+    if (!Comparand::isPossible(items[i])) return Value();
+  }
+  for (size_t i = 0; i < items.count(); ++i) {
+    Comparand item(items[i]);
+    const Answer answer = compareWithRange(relation, item, first, last);
+    if (answer == Answer::Unknown) return Value();
+    if (answer == Answer::Yes) return NSNumber::trueValue();
   }
   return NSNumber::falseValue();
 }

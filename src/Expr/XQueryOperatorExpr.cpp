@@ -3,7 +3,10 @@
 #include "Eval/StackGuard.h"
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryArithmetic.h"
+#include "Expr/XQueryComparison.h"
 #include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryLists.h"
+#include "Expr/XQueryRange.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/Collection.h"
@@ -174,11 +177,45 @@ Value XQueryOperatorExpr::evaluateWithLeftValue(const Value& left, XQueryContext
     if (isTrue == (_type == XQueryOperatorOr)) return NSNumber::numberWithBool(isTrue);
     return XQueryEffectiveBooleanValue(_right->evaluateWithContext(context), context);
   }
-  const Value right = _right->evaluateWithContext(context);
+  if (const XQueryOperatorExpr* range = rangeToCompareWith()) {
+    return evaluateWithRange(left, *range, context);
+  }
+  return answerFor(left, _right->evaluateWithContext(context), context);
+}
+
+// Raises what cannot be answered.
+Value XQueryOperatorExpr::answerFor(const Value& left, const Value& right,
+                                    XQueryContext& context) const {
   Value answer = isSign() ? XQueryUnarySign(_type, right, context)
                           : dispatch(_type, leftOrEmpty(left), right, context);
   if (isFailure(answer)) raiseFailure(answer, _line, context);
   return answer;
+}
+
+const XQueryOperatorExpr* XQueryOperatorExpr::rangeToCompareWith() const {
+  if (operatorClassification(_type) != GeneralComparison) return nullptr;
+  const XQueryExpr* right = _right.get();
+  while (const auto* list = dyn_cast<XQueryExprList>(right)) {  // parentheses
+    if (list->count() != 1) return nullptr;
+    right = list->objectAtIndex(0);
+  }
+  const auto* range = dyn_cast<XQueryOperatorExpr>(right);
+  return range && range->_type == XQueryOperatorTo ? range : nullptr;
+}
+
+// Comparing with a range, as in ". = 1 to 1000", asks for its bounds only, where it can.
+Value XQueryOperatorExpr::evaluateWithRange(const Value& left, const XQueryOperatorExpr& range,
+                                            XQueryContext& context) const {
+  XQueryCheckStack(context);
+  const Value start = range._left ? range._left->evaluateWithContext(context) : Value();
+  const Value end = range._right->evaluateWithContext(context);
+  const XQueryRangeBounds bounds = XQueryRangeBoundsFrom(range.leftOrEmpty(start), end, context);
+  if (!bounds.areIntegers) {
+    if (isFailure(bounds.answer)) raiseFailure(bounds.answer, range._line, context);
+    return answerFor(left, bounds.answer, context);
+  }
+  Value answer = XQueryGeneralComparisonWithRange(_type, left, bounds.first, bounds.last);
+  return answer ? answer : answerFor(left, XQueryRangeIntegers(bounds, context), context);
 }
 
 // A left operand that was never set is the empty sequence for every operator but the signs.

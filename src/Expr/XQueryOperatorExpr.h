@@ -96,6 +96,10 @@ class XQueryOperatorExpr : public XQueryExpr {
 
  private:
   Value evaluateWithLeftValue(const Value& left, XQueryContext& context) const;
+  Value evaluateWithRange(const Value& left, const XQueryOperatorExpr& range,
+                          XQueryContext& context) const;
+  const XQueryOperatorExpr* rangeToCompareWith() const;
+  Value answerFor(const Value& left, const Value& right, XQueryContext& context) const;
   Value leftOrEmpty(const Value& left) const;
 
   int _type;

@@ -2,6 +2,7 @@
 #include "Expr/OperatorTestSupport.h"
 #include "Expr/XQueryArithmetic.h"
 #include "Expr/XQueryComparison.h"
+#include "Expr/XQueryLeaves.h"
 #include "Types/XQueryAtomization.h"
 
 #include <gtest/gtest.h>
@@ -260,6 +261,39 @@ TEST(Shortcut, GeneralComparisonAnswersWhatThePlainAlgorithmAnswers) {
     expectSameGeneralComparison(code, generate.operand(), generate.operand());
     if (HasFatalFailure()) return;
   }
+}
+
+Ref<XQueryOperatorExpr> binary(int code, Value left, Ref<XQueryExpr> right) {
+  auto expr = XQueryOperatorExpr::operatorExpr(code, std::move(right));
+  expr->setLeftExpr(XQueryLiteral::literalWithValue(std::move(left)));
+  return expr;
+}
+
+// Comparing with a range written in the query, against comparing with its integers.
+TEST(Shortcut, ComparisonWithARangeAnswersWhatItsIntegersAnswer) {
+  Generator generate(6);
+  const int64_t bound = int64_t{1} << 53;
+  int taken = 0;
+  for (int round = 0; round < 40'000; ++round) {
+    const int code = XQueryOperatorEqual + static_cast<int>(generate.below(6));
+    const Value left = generate.operand();
+    int64_t first = static_cast<int64_t>(generate.below(40)) - 20;
+    if (generate.below(10) == 0) first += generate.below(2) ? bound - 10 : -bound;
+    const int64_t last = first + static_cast<int64_t>(generate.below(25)) - 4;
+    const auto range =
+        binary(XQueryOperatorTo, integer(first), XQueryLiteral::literalWithValue(integer(last)));
+    const auto expr = binary(code, left, range);
+    const std::string plain = outcome([&](XQueryContext& context) {
+      return XQueryGeneralComparisonPlainly(code, left, range->evaluateWithContext(context),
+                                            context);
+    });
+    // Invalid operands become an error only where the operator is evaluated.
+    ASSERT_EQ(outcome([&](XQueryContext& context) { return expr->evaluateWithContext(context); }),
+              plain == "null" ? invalidOperands : plain)
+        << show(left) << " op " << code << " " << first << " to " << last;
+    if (first <= last && XQueryGeneralComparisonWithRange(code, left, first, last)) ++taken;
+  }
+  EXPECT_GT(taken, 10'000);
 }
 
 TEST(Shortcut, GeneralComparisonOfManyItemsAnswersWhatThePlainAlgorithmAnswers) {

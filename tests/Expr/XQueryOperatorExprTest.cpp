@@ -1,5 +1,6 @@
 #include "Expr/OperatorTestSupport.h"
 #include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryLists.h"
 #include "Expr/XQueryOperatorExpr.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
@@ -225,6 +226,74 @@ TEST(Logical, AChainStopsEvaluatingAtTheDecidingOperand) {
       binary(XQueryOperatorAnd, binary(XQueryOperatorAnd, literal(boolean(false)), second), third);
   EXPECT_EQ(evaluateExpr(*chain), "false");
   EXPECT_EQ(second->evaluations + third->evaluations, 0);
+}
+
+// --- comparing with a range ----------------------------------------------------------------------
+
+Ref<XQueryOperatorExpr> range(Value first, Value last) {
+  return binary(XQueryOperatorTo, literal(std::move(first)), literal(std::move(last)));
+}
+
+TEST(ComparisonWithRange, MakesNoIntegers) {
+  // As a sequence it would be refused for its length.
+  const auto all = [] { return range(integer(-4'000'000'000'000), integer(4'000'000'000'000)); };
+  EXPECT_EQ(evaluateExpr(*binary(XQueryOperatorEqual, literal(integer(5)), all())), "true");
+  EXPECT_EQ(evaluateExpr(*binary(XQueryOperatorEqual, literal(number(5.5)), all())), "false");
+  EXPECT_EQ(evaluateExpr(*binary(XQueryOperatorEqual, literal(untyped("5")), all())), "true");
+  EXPECT_EQ(evaluateExpr(*binary(XQueryOperatorEqual, literal(decimal("5")), all())),
+            "error 0 limit: range of too many items");
+  auto parentheses = XQueryExprList::exprList();
+  parentheses->addObject(all());
+  EXPECT_EQ(evaluateExpr(*binary(XQueryOperatorLess, literal(integer(5)), parentheses)), "true");
+}
+
+TEST(ComparisonWithRange, EvaluatesLeftThenTheBounds) {
+  std::vector<std::string> log;
+  const auto bounds = binary(XQueryOperatorTo, Probe::probe(integer(1), &log, "b"),
+                             Probe::probe(integer(3), &log, "c"));
+  const auto expr = binary(XQueryOperatorEqual, Probe::probe(integer(2), &log, "a"), bounds);
+  EXPECT_EQ(evaluateExpr(*expr), "true");
+  EXPECT_EQ(log, (std::vector<std::string>{"a", "b", "c"}));
+}
+
+TEST(ComparisonWithRange, AnEmptyRangeGivesTheEmptySequence) {
+  EXPECT_EQ(evaluateExpr(
+                *binary(XQueryOperatorEqual, literal(integer(5)), range(integer(5), integer(3)))),
+            "()");
+  EXPECT_EQ(
+      evaluateExpr(*binary(XQueryOperatorEqual, literal(integer(5)), range(empty(), integer(3)))),
+      "()");
+  EXPECT_EQ(
+      evaluateExpr(*binary(XQueryOperatorEqual, literal(empty()), range(integer(1), integer(3)))),
+      "()");
+}
+
+TEST(ComparisonWithRange, BadBoundsFailAtTheLineOfTheRange) {
+  const auto bounds = range(Value(), integer(3));
+  bounds->setExprLine(7);
+  const auto expr = binary(XQueryOperatorEqual, literal(integer(5)), bounds);
+  const Ref<XQueryContext> context = XQueryContext::xqueryContext();
+  EXPECT_THROW((void)expr->evaluateWithContext(*context), NSException);
+  EXPECT_EQ(context->_internal().error()->msg()->utf8(), "invalid type for operator");
+  EXPECT_EQ(context->_internal().error()->line(), 8);
+}
+
+TEST(ComparisonWithRange, AnItemThatCannotBeAtomizedFailsBeforeAnyPairAnswers) {
+  const Value items = sequence({integer(2), XQueryError::error(6, "made up")});
+  EXPECT_EQ(
+      evaluateExpr(*binary(XQueryOperatorEqual, literal(items), range(integer(1), integer(3)))),
+      "error 6 invalid type");
+}
+
+TEST(OperatorDispatch, ACodeOfAnotherClassIsNoGeneralComparison) {
+  for (const int code : {-5, 0, 12, 19, 25, 1000}) {
+    EXPECT_EQ(outcome([&](XQueryContext& context) {
+                return XQueryOperatorExpr::generalComparisonOperatorEvaluate(code, integer(1),
+                                                                             integer(1), context);
+              }),
+              "null")
+        << code;
+  }
 }
 
 // --- signs and absent operands -------------------------------------------------------------------

@@ -1,0 +1,88 @@
+#include "Expr/XQueryRange.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryOperatorExpr.h"
+#include "Expr/XQuerySequence.h"
+#include "Types/XQueryErrors.h"
+#include "Types/XQueryNumber.h"
+#include "Types/XQueryTypeTable.h"
+#include "xquery/Collection.h"
+#include "xquery/Error.h"
+
+#include <algorithm>
+#include <new>
+#include <unistd.h>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+// A range is built at once, so its size is bounded: by 2^31 items, past which a position would no
+// longer fit the 32-bit lengths used elsewhere, and by a quarter of the memory that the machine
+// has, since a request beyond the memory would not fail but have the process killed.
+uint64_t mostRangeItems() {
+  static const uint64_t most = [] {
+    constexpr uint64_t positionBound = uint64_t{1} << 31;
+    constexpr uint64_t bytesPerItem = sizeof(Value) + sizeof(XQueryNumber);
+    const int64_t pages = sysconf(_SC_PHYS_PAGES);
+    const int64_t pageSize = sysconf(_SC_PAGE_SIZE);
+    if (pages <= 0 || pageSize <= 0) return positionBound;
+    const uint64_t memory = static_cast<uint64_t>(pages) * static_cast<uint64_t>(pageSize);
+    return std::min(positionBound, memory / 4 / bytesPerItem);
+  }();
+  return most;
+}
+
+[[noreturn]] void raiseRangeTooLong(XQueryContext& context) {
+  context._internal().raise(XQueryErrors::rangeTooLong.error());
+}
+
+}  // namespace
+
+XQueryRangeBounds XQueryRangeBoundsFrom(const Value& left, const Value& right,
+                                        XQueryContext& context) {
+  XQueryRangeBounds bounds;
+  const Value start = normalised(left);
+  const Value end = normalised(right);
+  if (!start || !end) return bounds;
+  if (isNull(start) || isNull(end)) {
+    bounds.answer = NSNull::null();
+    return bounds;
+  }
+  const Value first = XQueryPromoteToInteger(start, context);
+  const Value last = XQueryPromoteToInteger(end, context);
+  const auto* firstNumber = dyn_cast<NSNumber>(first);
+  const auto* lastNumber = dyn_cast<NSNumber>(last);
+  if (!firstNumber || !lastNumber) return bounds;
+  bounds.areIntegers = firstNumber->compare(*lastNumber) <= 0;
+  if (!bounds.areIntegers) bounds.answer = XQuerySequence::sequence();
+  bounds.first = firstNumber->longLongValue();
+  bounds.last = lastNumber->longLongValue();
+  return bounds;
+}
+
+Value XQueryRangeIntegers(const XQueryRangeBounds& bounds, XQueryContext& context) {
+  const uint64_t first = static_cast<uint64_t>(bounds.first);
+  const uint64_t distance = static_cast<uint64_t>(bounds.last) - first;
+  if (distance >= mostRangeItems()) raiseRangeTooLong(context);
+  const Ref<XQuerySequence> sequence = XQuerySequence::sequence();
+  try {
+    std::vector<Value>& items = sequence->objects();
+    items.reserve(distance + 1);
+    // Counted by distance: the last integer may be the greatest there is.
+    for (uint64_t offset = 0; offset <= distance; ++offset) {
+      items.push_back(XQueryNumber::integerWithInt64(static_cast<int64_t>(first + offset)));
+    }
+  } catch (const std::bad_alloc&) {
+    raiseRangeTooLong(context);
+  }
+  return sequence;
+}
+
+Value XQueryOperatorExpr::rangeOperatorEvaluate(int, const Value& withLeft, const Value& right,
+                                                XQueryContext& forContext) {
+  const XQueryRangeBounds bounds = XQueryRangeBoundsFrom(withLeft, right, forContext);
+  return bounds.areIntegers ? XQueryRangeIntegers(bounds, forContext) : bounds.answer;
+}
+
+}  // namespace xquery

@@ -1,0 +1,26 @@
+// The range operator.
+#pragma once
+
+#include "xquery/Object.h"
+
+#include <cstdint>
+
+namespace xquery {
+
+class XQueryContext;
+
+// What the operands of a range come to.
+struct XQueryRangeBounds {
+  bool areIntegers = false;
+  int64_t first = 0;  // not above `last`
+  int64_t last = 0;
+  // Without integers, the answer: null for invalid operands, the empty sequence in either form.
+  Value answer;
+};
+
+XQueryRangeBounds XQueryRangeBoundsFrom(const Value& left, const Value& right,
+                                        XQueryContext& context);
+// The integers from bounds that have them. Raises error 0 when they are too many.
+Value XQueryRangeIntegers(const XQueryRangeBounds& bounds, XQueryContext& context);
+
+}  // namespace xquery
