@@ -15,10 +15,15 @@ NSXMLNode* XQueryFollowingStart(const NSXMLNode* node) {
   return nullptr;
 }
 
-std::vector<const NSXMLNode*> XQueryAncestors(const NSXMLNode* node) {
-  std::vector<const NSXMLNode*> ancestors;
-  for (const NSXMLNode* at = node->parent(); at; at = at->parent()) ancestors.push_back(at);
+std::vector<NSXMLNode*> XQueryAncestors(const NSXMLNode* node) {
+  std::vector<NSXMLNode*> ancestors;
+  for (NSXMLNode* at = node->parent(); at; at = at->parent()) ancestors.push_back(at);
   return ancestors;
+}
+
+NSXMLNode* XQueryLastInSubtree(NSXMLNode* node) {
+  while (NSXMLNode* child = node->lastChild()) node = child;
+  return node;
 }
 
 }  // namespace xquery

@@ -2,8 +2,9 @@
 //
 // XQueryWalkAxis visits the nodes on an axis of a node, in the order in which a path sees them:
 // document order for the forward axes and for preceding, nearest first for the other reverse axes.
-// The visitor answers whether the walk goes on. Nothing is allocated, except that the preceding
-// axis keeps the list of the node's ancestors.
+// XQueryWalkAlongAxis visits the same nodes in the order in which predicates count them, nearest
+// first for preceding too. The visitor answers whether the walk goes on. Nothing is allocated,
+// except that the preceding axis in document order keeps the list of the node's ancestors.
 #pragma once
 
 #include "Expr/XQueryPath.h"
@@ -22,7 +23,10 @@ NSXMLNode* XQueryDescendantStop(const NSXMLNode* node);
 NSXMLNode* XQueryFollowingStart(const NSXMLNode* node);
 
 // The ancestors of a node, the root last.
-std::vector<const NSXMLNode*> XQueryAncestors(const NSXMLNode* node);
+std::vector<NSXMLNode*> XQueryAncestors(const NSXMLNode* node);
+
+// The deepest last descendant of a node, or the node itself: the last node of its subtree.
+NSXMLNode* XQueryLastInSubtree(NSXMLNode* node);
 
 // Visits `first` and each node after it in document order, up to (excluding) `stop`.
 template <class Visit>
@@ -32,23 +36,45 @@ void XQueryWalkNodes(NSXMLNode* first, const NSXMLNode* stop, Visit& visit) {
   }
 }
 
-// An attribute or namespace node is in nobody's order of next nodes: its walk ends at its parent
-// element.
+// The same without the ancestors of `stop` given, the outermost last.
 template <class Visit>
-void XQueryWalkPreceding(NSXMLNode* node, Visit& visit) {
-  NSXMLNode* root = node->rootNode();
-  if (!root || root == node) return;
-  std::vector<const NSXMLNode*> ancestors = XQueryAncestors(node);
-  const bool isChild = node->kind() != Kind::Attribute && node->kind() != Kind::Namespace;
+void XQueryWalkNodesExcept(NSXMLNode* first, const NSXMLNode* stop,
+                           std::vector<NSXMLNode*> ancestors, Visit& visit) {
   auto visitUnlessAncestor = [&](NSXMLNode* candidate) {
-    // The walk meets the ancestors from the root downwards.
+    // The walk meets the ancestors from the outermost inwards.
     if (!ancestors.empty() && candidate == ancestors.back()) {
       ancestors.pop_back();
       return true;
     }
     return visit(candidate);
   };
-  XQueryWalkNodes(root, isChild ? node : node->parent(), visitUnlessAncestor);
+  XQueryWalkNodes(first, stop, visitUnlessAncestor);
+}
+
+// An attribute or namespace node is in nobody's order of next nodes: its walk ends at its parent
+// element.
+template <class Visit>
+void XQueryWalkPreceding(NSXMLNode* node, Visit& visit) {
+  NSXMLNode* root = node->rootNode();
+  if (root == node) return;
+  const bool isChild = node->kind() != Kind::Attribute && node->kind() != Kind::Namespace;
+  XQueryWalkNodesExcept(root, isChild ? node : node->parent(), XQueryAncestors(node), visit);
+}
+
+// What precedes a node are the subtrees of the siblings before it and before its ancestors.
+template <class Visit>
+void XQueryWalkPrecedingNearestFirst(NSXMLNode* node, Visit& visit) {
+  for (const NSXMLNode* above = node; above; above = above->parent()) {
+    for (NSXMLNode* top = above->previousSibling(); top; top = top->previousSibling()) {
+      NSXMLNode* at = XQueryLastInSubtree(top);
+      while (at != top) {
+        if (!visit(at)) return;
+        NSXMLNode* previous = at->previousSibling();
+        at = previous ? XQueryLastInSubtree(previous) : at->parent();
+      }
+      if (!visit(top)) return;
+    }
+  }
 }
 
 template <class Visit>
@@ -110,6 +136,15 @@ void XQueryWalkAxis(NSXMLNode* node, int axis, Visit visit) {
       return XQueryWalkAncestors(node, visit);
     default:  // no such axis: nothing is walked
       return;
+  }
+}
+
+template <class Visit>
+void XQueryWalkAlongAxis(NSXMLNode* node, int axis, Visit visit) {
+  if (axis == XQueryAxisPreceding) {
+    XQueryWalkPrecedingNearestFirst(node, visit);
+  } else {
+    XQueryWalkAxis(node, axis, visit);
   }
 }
 

@@ -1,21 +1,29 @@
 // Steps and paths.
 //
-// A shortcut for "//": a step descendant-or-self::node() and a child step after it visit, for a
-// node whose descendant axis ends with its subtree, exactly the node's descendants, each once, as
-// the child of its parent. The descendant axis visits the same nodes in document order without
-// touching every node twice. The order differs (the two steps go parent by parent), so the child
-// step takes the descendant axis of the node only when
-//   - neither step has predicates, and the child step's test cannot raise an error,
-//   - every step after them is an axis step that evaluates nothing and cannot raise an error, so
-//     that nothing can tell in which order the nodes arrive, and
-//   - the path's results will be sorted, and no error can arise from the path's own items.
-// Binding finds the steps (`_absorbsNext`); the node and the results are looked at in processNode.
+// Two shortcuts rest on steps that can be repeated: axis steps whose test cannot raise an error and
+// whose predicates answer the same for the same focus and do nothing else (an error in a predicate
+// only drops its item). What a chain of such steps yields from a node is always the same, nobody
+// can tell when or how often it is asked, and a result holds every node once. Binding finds where
+// this holds (findShortcuts); both are left out while an error may arise from the path's own items,
+// since it would leave the focus of the step it met.
+//
+// A step without predicates at the head of such a chain keeps a trail: it does not walk nodes again
+// that it has walked from an earlier context item (XQueryAxisTrail). Trails hold nodes of the
+// path's items only, which live as long as the evaluation: steps behind a filter step keep none.
+//
+// "//": a step descendant-or-self::node() and a child step after it visit, for a node whose
+// descendant axis ends with its subtree, exactly the node's descendants, each once, as the child of
+// its parent. The descendant axis visits the same nodes in document order without touching every
+// node twice. The order differs (the two steps go parent by parent), so the child step takes the
+// descendant axis of the node only when neither step has predicates, both are repeatable with all
+// steps after them, and the path's results will be sorted.
 #include "Expr/XQueryPath.h"
 
 #include "Eval/StackGuard.h"
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryAxisWalk.h"
 #include "Expr/XQueryPathRun.h"
+#include "Expr/XQueryRepeatable.h"
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
@@ -40,7 +48,9 @@ bool allAreNodes(const Value& items) {
 // Whether the node's descendant axis ends where its subtree ends.
 bool descendantsAreSubtree(const NSXMLNode* node) {
   if (node->kind() != Kind::Element && node->kind() != Kind::Document) return false;
-  return !node->parent() || XQueryDescendantStop(node);
+  // Without a node to stop at the walk goes to the end of the document, which is the end of the
+  // subtree of the topmost node and of its last child.
+  return XQueryDescendantStop(node) || !node->parent() || !node->parent()->parent();
 }
 
 }  // namespace
@@ -48,12 +58,14 @@ bool descendantsAreSubtree(const NSXMLNode* node) {
 // --- the chain -----------------------------------------------------------------------------------
 
 void XQueryStep::setNext(Ref<XQueryStep> next) {
+  for (XQueryStep* step = _next.get(); step; step = step->next()) step->_isCutOff = true;
   _next = std::move(next);
   _tail = nullptr;
 }
 
 void XQueryStep::setLast(Ref<XQueryStep> last) {
-  XQueryStep* end = _tail ? _tail.get() : this;
+  // A tail is reached through the links that lay before it then; a replaced link cut it off.
+  XQueryStep* end = _tail && !_tail->_isCutOff ? _tail.get() : this;
   while (end->_next) end = end->_next.get();
   end->_next = last;
   _tail = std::move(last);
@@ -118,9 +130,11 @@ bool XQueryAxisStep::testMayRaise() const {
   return wildCard && wildCard->mayRaise();
 }
 
-// Whether the step evaluates nothing and raises nothing.
-bool XQueryAxisStep::isPure() const {
-  return !testMayRaise() && hasOnlyLiteralPositions();
+bool XQueryAxisStep::isRepeatable() const {
+  if (testMayRaise()) return false;
+  return std::all_of(_predicates.begin(), _predicates.end(), [](const auto& predicate) {
+    return !predicate || XQueryIsRepeatable(*predicate);
+  });
 }
 
 // Whether this is the step that "//" stands for.
@@ -133,6 +147,23 @@ bool XQueryAxisStep::isDescendantShorthand() const {
 
 bool XQueryAxisStep::takesPlainChildren() const {
   return _axis == XQueryAxisChild && _predicates.empty();
+}
+
+// Whether walks of a step without predicates from different nodes may meet the same node, apart
+// from those whose nodes go straight to the results, which hold each node once anyway.
+bool XQueryAxisStep::mayWalkTwice(const XQueryAxisStep* previous) const {
+  if (!_predicates.empty()) return false;
+  switch (_axis) {
+    case XQueryAxisChild:  // walks descendants in place of a "//" before it
+      return previous && previous->isDescendantShorthand();
+    case XQueryAxisAttribute:
+    case XQueryAxisSelf:
+      return false;
+    case XQueryAxisParent:
+      return static_cast<bool>(_next);
+    default:
+      return true;
+  }
 }
 
 void XQueryAxisStep::processItems(const Value& items, XQueryPathResults& toResults,
@@ -160,12 +191,15 @@ void XQueryAxisStep::processNode(NSXMLNode* node, XQueryPathRun& run) const {
   enter(node, run);
   if (!_predicates.empty()) {
     filter(node, run);
-  } else if (_absorbsNext && run.orderIsFree && !run.setsEveryFocus &&
-             descendantsAreSubtree(node)) {
+  } else if (absorbsNextFor(node, run)) {
     cast<XQueryAxisStep>(_next.get())->stream(XQueryAxisDescendant, node, run);
   } else {
     stream(_axis, node, run);
   }
+}
+
+bool XQueryAxisStep::absorbsNextFor(const NSXMLNode* node, const XQueryPathRun& run) const {
+  return _absorbsNext && run.orderIsFree && !run.setsEveryFocus && descendantsAreSubtree(node);
 }
 
 void XQueryAxisStep::enter(NSXMLNode* node, XQueryPathRun& run) const {
@@ -176,18 +210,22 @@ void XQueryAxisStep::enter(NSXMLNode* node, XQueryPathRun& run) const {
 // Hands each node on as it is found.
 void XQueryAxisStep::stream(int axis, NSXMLNode* node, XQueryPathRun& run) const {
   XQueryNodeTest test(_expr.get(), run);
-  if (const XQueryStep* next = _next.get()) {
-    XQueryWalkAxis(node, axis, [&](NSXMLNode* found) {
-      if (test.matches(found)) next->processNode(found, run);
-      return true;
-    });
-    return;
-  }
-  XQueryWalkAxis(node, axis, [&](NSXMLNode* found) {
-    if (test.matches(found)) run.results.addNode(found, run.context);
+  const XQueryStep* next = _next.get();
+  const auto handOn = [&](NSXMLNode* found) {
+    if (!test.matches(found)) return true;
+    if (next) {
+      next->processNode(found, run);
+    } else {
+      run.results.addNode(found, run.context);
+    }
     return true;
-  });
-  run.results.setIsReversed(isReverse());
+  };
+  if (_trail != noTrail && !run.setsEveryFocus) {
+    run.trail(_trail).walk(node, axis, handOn);
+  } else {
+    XQueryWalkAxis(node, axis, handOn);
+  }
+  if (!next) run.results.setIsReversed(isReverse());
 }
 
 // Gathers the nodes found from one context item, filters them and hands on what is left.
@@ -208,23 +246,21 @@ void XQueryAxisStep::filter(NSXMLNode* node, XQueryPathRun& run) const {
 size_t XQueryAxisStep::collect(NSXMLNode* node, std::vector<NSXMLNode*>& nodes,
                                XQueryPathRun& run) const {
   XQueryNodeTest test(_expr.get(), run);
-  const bool walksAlongAxis = _axis != XQueryAxisPreceding;
-  const auto position = walksAlongAxis ? literalPosition(0) : std::nullopt;
+  const auto position = literalPosition(0);
   if (position && !testMayRaise()) {
     uint64_t left = *position;
     if (left == 0) return 1;
-    XQueryWalkAxis(node, _axis, [&](NSXMLNode* found) {
+    XQueryWalkAlongAxis(node, _axis, [&](NSXMLNode* found) {
       if (!test.matches(found) || --left > 0) return true;
       nodes.push_back(found);
       return false;
     });
     return 1;
   }
-  XQueryWalkAxis(node, _axis, [&](NSXMLNode* found) {
+  XQueryWalkAlongAxis(node, _axis, [&](NSXMLNode* found) {
     if (test.matches(found)) nodes.push_back(found);
     return true;
   });
-  if (!walksAlongAxis) std::reverse(nodes.begin(), nodes.end());
   return 0;
 }
 
@@ -306,17 +342,27 @@ Ref<XQueryPathExpr> XQueryPathExpr::pathExprWithStep(Ref<XQueryStep> step) {
 
 void XQueryPathExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
+  for (XQueryStep* step = _step.get(); step; step = step->next()) step->bindInfoForProlog(prolog);
+  findShortcuts();
+}
+
+void XQueryPathExpr::findShortcuts() {
   std::vector<XQueryStep*> steps;
+  bool nodesMayGo = false;  // some nodes are held by an intermediate result only
   for (XQueryStep* step = _step.get(); step; step = step->next()) {
-    step->bindInfoForProlog(prolog);
+    nodesMayGo = nodesMayGo || (step != _step.get() && !isa<XQueryAxisStep>(step));
     steps.push_back(step);
   }
-  // From the end, as long as everything behind a step evaluates and raises nothing.
+  _trailCount = 0;
+  // From the end, as long as everything from a step on is repeatable.
   for (size_t i = steps.size(); i-- > 0;) {
     auto* step = dyn_cast<XQueryAxisStep>(steps[i]);
-    if (!step || !step->isPure()) break;
+    if (!step || !step->isRepeatable()) break;
     const auto* next = dyn_cast<XQueryAxisStep>(step->next());
     step->_absorbsNext = step->isDescendantShorthand() && next && next->takesPlainChildren();
+    const auto* previous = i == 0 ? nullptr : dyn_cast<XQueryAxisStep>(steps[i - 1]);
+    const bool keepsTrail = !nodesMayGo && step->mayWalkTwice(previous);
+    step->_trail = keepsTrail ? _trailCount++ : XQueryAxisStep::noTrail;
   }
 }
 
@@ -351,6 +397,7 @@ Value XQueryPathExpr::evaluateSteps(XQueryContext& context) const {
   XQueryPathRun run(results, context);
   run.setsEveryFocus = !allAreNodes(items);
   run.orderIsFree = dynamic.ordered();
+  run.trailCount = _trailCount;
   step->processValue(items, run, true);
   return results.value(dynamic.ordered());
 }

@@ -65,12 +65,11 @@ class XQueryStep : public NSCounted {
   const std::optional<uint64_t>& literalPosition(size_t index) const {
     return _literalPositions[index];
   }
-  // Whether every predicate is a numeric literal, so that filtering evaluates nothing.
-  bool hasOnlyLiteralPositions() const;
 
   Ref<XQueryExpr> _expr;
   Ref<XQueryStep> _next;
-  Ref<XQueryStep> _tail;  // where the last setLast ended: the chain's end, or near it
+  Ref<XQueryStep> _tail;   // where the last setLast ended: the chain's end, or near it
+  bool _isCutOff = false;  // a link before this step was replaced: no tail any more
   std::vector<Ref<XQueryExpr>> _predicates;
 
  private:
@@ -119,13 +118,19 @@ class XQueryAxisStep : public XQueryStep {
   void filter(NSXMLNode* node, XQueryPathRun& run) const;
   size_t collect(NSXMLNode* node, std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const;
   bool testMayRaise() const;
-  bool isPure() const;
+  bool isRepeatable() const;
   bool isDescendantShorthand() const;
   bool takesPlainChildren() const;
+  bool mayWalkTwice(const XQueryAxisStep* previous) const;
+  bool absorbsNextFor(const NSXMLNode* node, const XQueryPathRun& run) const;
   friend class XQueryPathExpr;
 
+  static constexpr size_t noTrail = SIZE_MAX;
+
   int _axis;
-  bool _absorbsNext = false;  // set by binding, see XQueryPath.cpp
+  // Set by binding, see XQueryPath.cpp.
+  bool _absorbsNext = false;
+  size_t _trail = noTrail;
 };
 
 class XQueryFilterStep : public XQueryStep {
@@ -197,8 +202,10 @@ class XQueryPathExpr : public XQueryExpr {
 
  private:
   Value evaluateSteps(XQueryContext& context) const;
+  void findShortcuts();
 
   Ref<XQueryStep> _step;
+  size_t _trailCount = 0;
 };
 
 }  // namespace xquery

@@ -2,6 +2,7 @@
 // its nodes.
 #pragma once
 
+#include "Expr/XQueryAxisTrail.h"
 #include "Expr/XQueryNameTest.h"
 #include "Expr/XQueryPathResults.h"
 #include "Expr/XQueryTypeDeclaration.h"
@@ -27,6 +28,13 @@ class XQueryPathRun {
   // The results will be sorted, so the order in which nodes arrive is free.
   bool orderIsFree = false;
 
+  // How many steps of the path keep trails.
+  size_t trailCount = 0;
+  XQueryAxisTrail& trail(size_t index) {
+    if (_trails.empty()) _trails.resize(trailCount);
+    return _trails[index];
+  }
+
   bool contextHasDefaultNamespace();
   // The interned name of a deferred test; resolved once (which may raise) and kept while the path
   // is evaluated. Null for a name that no node can have.
@@ -47,6 +55,7 @@ class XQueryPathRun {
 
   std::vector<std::pair<const XQueryNameTest*, NSXMLExpandedNameRef>> _deferredNames;
   std::deque<std::vector<NSXMLNode*>> _nodeLists;
+  std::vector<XQueryAxisTrail> _trails;
   size_t _openNodeLists = 0;
   DefaultNamespace _defaultNamespace = DefaultNamespace::Unknown;
 };

@@ -13,8 +13,6 @@
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
 
-#include <algorithm>
-
 namespace xquery {
 namespace {
 
@@ -86,11 +84,6 @@ std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicat
   const XQueryLiteral* literal = literalIn(predicate);
   if (!literal || !XQueryIsNumericType(literal->literalValue().get())) return std::nullopt;
   return cast<NSNumber>(literal->literalValue())->unsignedIntegerValue();
-}
-
-bool XQueryStep::hasOnlyLiteralPositions() const {
-  return std::all_of(_literalPositions.begin(), _literalPositions.end(),
-                     [](const auto& position) { return position.has_value(); });
 }
 
 Value XQueryStep::handlePreicatesFromIndex(size_t index, Value items,

@@ -1,6 +1,8 @@
 #include "Expr/XQueryPath.h"
 #include "Expr/XQueryPathResults.h"
+#include "Expr/XQuerySequence.h"
 #include "PathTesting.h"
+#include "xquery/Number.h"
 
 namespace xquery {
 namespace {
@@ -205,6 +207,19 @@ TEST_F(Path, SetNextReplacesTheRestOfTheChain) {
   first->setLast(child("d"));
   EXPECT_EQ(first->next(), other.get());
   EXPECT_TRUE(other->next());
+}
+
+TEST_F(Path, SetLastSeesWhatSetNextReplacedInTheMiddle) {
+  const auto first = child("a");
+  const auto second = child("b");
+  first->setLast(second);
+  first->setLast(child("c"));
+  const auto other = child("d");
+  second->setNext(other);
+  const auto last = child("e");
+  first->setLast(last);
+  EXPECT_EQ(second->next(), other.get());
+  EXPECT_EQ(other->next(), last.get());
 }
 
 TEST_F(Path, StepsAndPredicatesAreBoundInOrder) {
@@ -434,6 +449,101 @@ TEST_F(Path, ANameThatDoesNotResolveLeavesTheContextItemOfItsStep) {
             "1: can't resolve QName for \"no:b\"");
   EXPECT_EQ(shown(context->_internal().contextItem()), "r");
   EXPECT_EQ(context->_internal().position(), 0);
+}
+
+// --- nodes met more than once --------------------------------------------------------------------
+
+// Each would take hours if every context item walked its whole axis.
+class OverlappingAxes : public PathTesting {
+ protected:
+  static constexpr int count = 300000;
+  static std::string repeated(std::string_view part, int times = count) {
+    std::string result;
+    for (int i = 0; i < times; ++i) result += part;
+    return result;
+  }
+  size_t found(const Value& item, const Steps& steps) {
+    const Value answer = evaluateFrom(item, steps);
+    const auto* array = dyn_cast<NSArray>(answer);
+    return array ? array->count() : isNull(answer) ? 0 : 1;
+  }
+  // "//a" and then the step.
+  size_t foundFromEvery(const Value& item, Ref<XQueryStep> last) {
+    return found(item, {rootStep(), anyDepth(), child("a"), std::move(last)});
+  }
+};
+
+TEST_F(OverlappingAxes, OfNestedElements) {
+  const auto deep = parsed(repeated("<a>") + repeated("</a>"));
+  for (const bool ordered : {true, false}) {
+    context->_internal().setOrdered(ordered);
+    EXPECT_EQ(found(deep, {rootStep(), anyDepth(), child("a"), anyDepth(), child("a")}),
+              count - 1U);
+    EXPECT_EQ(foundFromEvery(deep, step(XQueryAxisDescendant, anyName())), count - 1U);
+    EXPECT_EQ(foundFromEvery(deep, step(XQueryAxisAncestor, anyName())), count - 1U);
+    EXPECT_EQ(foundFromEvery(deep, step(XQueryAxisAncestorOrSelf, anyNode())), count + 1U);
+  }
+}
+
+TEST_F(OverlappingAxes, OfSiblings) {
+  const auto flat = parsed("<r>" + repeated("<a/>") + "</r>");
+  for (const bool ordered : {true, false}) {
+    context->_internal().setOrdered(ordered);
+    for (const int axis : {XQueryAxisFollowingSibling, XQueryAxisFollowing, XQueryAxisPreceding,
+                           XQueryAxisPrecedingSibling}) {
+      EXPECT_EQ(foundFromEvery(flat, step(axis, name("a"))), count - 1U) << axis;
+    }
+  }
+  EXPECT_EQ(found(flat, {rootStep(), anyDepth(), child("a"), step(XQueryAxisParent, anyNode()),
+                         anyDepth(), child("a")}),
+            static_cast<size_t>(count));
+}
+
+TEST_F(OverlappingAxes, ThatRunToTheEndOfTheDocument) {
+  const auto lasts = parsed("<r>" + repeated("<g><p><a/></p></g>") + "</r>");
+  EXPECT_EQ(foundFromEvery(lasts, step(XQueryAxisDescendant, name("a"))), count - 1U);
+  EXPECT_EQ(found(lasts, {rootStep(), anyDepth(), child("a"), anyDepth(), child("p")}), count - 1U);
+}
+
+TEST_F(OverlappingAxes, BeforeStepsWhosePredicatesMayBeRepeated) {
+  const auto lasts = parsed("<r>" + repeated("<g><p><a><b/></a></p></g>", 30000) + "</r>");
+  EXPECT_EQ(found(lasts, {rootStep(), anyDepth(), child("b"), anyDepth(),
+                          child("p", {path({child("a")})})}),
+            29999U);
+}
+
+TEST_F(OverlappingAxes, EndAtAPositionFoundNearby) {
+  const auto flat = parsed("<r>" + repeated("<a/>") + "</r>");
+  EXPECT_EQ(foundFromEvery(flat, step(XQueryAxisPreceding, name("a"), {integer("1")})), count - 1U);
+  EXPECT_EQ(foundFromEvery(flat, step(XQueryAxisFollowing, name("a"), {integer("2")})), count - 2U);
+}
+
+TEST_F(OverlappingAxes, AreWalkedAgainForAPredicateThatMayHaveEffects) {
+  const auto nested = parsed("<a><a><a/></a></a>");
+  int evaluations = 0;
+  const auto counting = probe([&](XQueryContext&) -> Value {
+    ++evaluations;
+    return NSNumber::trueValue();
+  });
+  EXPECT_EQ(
+      found(nested, {rootStep(), anyDepth(), child("a"), step(XQueryAxisAncestorOrSelf, name("a")),
+                     step(XQueryAxisSelf, anyNode(), {counting})}),
+      3U);
+  EXPECT_EQ(evaluations, 6);
+}
+
+TEST_F(OverlappingAxes, OfTreesThatGoAwayAreWalkedAnew) {
+  // Every context item yields a tree of its own, and the next may lie where the last one lay.
+  int trees = 0;
+  const auto freshTree = probe([&](XQueryContext&) -> Value {
+    ++trees;
+    return parsed("<r><x><y/></x></r>");
+  });
+  const auto flat = parsed("<r>" + repeated("<a/>", 50) + "</r>");
+  const Steps steps = {step(XQueryAxisChild, name("a")), filterStep(freshTree),
+                       step(XQueryAxisDescendant, name("y")), step(XQueryAxisAncestor, anyNode())};
+  EXPECT_EQ(found(flat->rootElement(), steps), 150U);
+  EXPECT_EQ(trees, 50);
 }
 
 // --- depth ---------------------------------------------------------------------------------------
