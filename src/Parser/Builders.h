@@ -6,9 +6,6 @@
 // query does not have, and for the absent operand that a validate expression is. A line is that of
 // the construct's first token, counted from 0. A list is an array; each ...Add builder appends to
 // the list it is given and answers that same list.
-//
-// Constructs that the engine cannot compile are parsed in full. Their builders report them and
-// answer the empty literal, so that the rest of the query is still checked.
 #pragma once
 
 #include "Expr/XQueryFLWOR.h"

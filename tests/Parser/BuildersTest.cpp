@@ -26,7 +26,6 @@ Ref<XQueryParsedModule> module(std::string_view query) {
       << (parser->errors().empty() ? "" : parser->errors()[0]->msg()->utf8());
   return parser->parsedModule();
 }
-
 // Writes an expression in a form that shows its tree.
 std::string shape(const XQueryExpr* expr);
 

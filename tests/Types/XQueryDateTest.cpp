@@ -1,6 +1,5 @@
-#include "Types/XQueryDate.h"
-
 #include "Platform/ZoneTestSupport.h"
+#include "Types/XQueryDate.h"
 #include "TypesTestSupport.h"
 
 #include <clocale>
@@ -314,7 +313,8 @@ TEST(XQueryDate, GMTIsMadeOnce) {
 }
 
 TEST(XQueryDate, IsMadeFromAnIntervalInTheLocalZone) {
-  const Ref<XQueryDate> date = XQueryDate::xqueryDateWithTimeIntervalSinceReferenceDate(86400.5, 22);
+  const Ref<XQueryDate> date =
+      XQueryDate::xqueryDateWithTimeIntervalSinceReferenceDate(86400.5, 22);
   EXPECT_EQ(date->typeID(), 22);
   EXPECT_EQ(date->timeIntervalSinceReferenceDate(), 86400.5);
   EXPECT_EQ(date->timeZone().get(), NSTimeZone::localTimeZone());
@@ -353,9 +353,9 @@ TEST(XQueryDate, TheContextKeepsItsFirstPresent) {
 
 TEST(XQueryDate, EqualityIsThatOfTheInstants) {
   const Value values[] = {parse(21, "2004-02-29T00:00:00Z"), parse(21, "2004-02-29T05:00:00+05:00"),
-                          parse(22, "2004-02-29Z"), NSDate::dateWithTimeIntervalSinceReferenceDate(
-                                                        parse(22, "2004-02-29Z")
-                                                            ->timeIntervalSinceReferenceDate())};
+                          parse(22, "2004-02-29Z"),
+                          NSDate::dateWithTimeIntervalSinceReferenceDate(
+                              parse(22, "2004-02-29Z")->timeIntervalSinceReferenceDate())};
   for (const Value& a : values) {
     for (const Value& b : values) {
       EXPECT_TRUE(XQueryObjectsEqual(*a, *b));
@@ -377,8 +377,9 @@ TEST(XQueryDate, APlainPlatformDateHasNoAtomicType) {
 TEST(XQueryDate, ItsTypeIsNamedAndItsTextPublished) {
   const char* const names[] = {"xs:gYearMonth", "xs:gYear",    "xs:gMonthDay", "xs:gDay",
                                "xs:gMonth",     "xs:dateTime", "xs:date",      "xs:time"};
-  const char* const texts[] = {"2004-05", "2004", "--05-06", "---06", "--05--",
-                               "2004-05-06T01:02:03", "2004-05-06", "01:02:03"};
+  const char* const texts[] = {"2004-05",    "2004",    "--05-06",
+                               "---06",      "--05--",  "2004-05-06T01:02:03",
+                               "2004-05-06", "01:02:03"};
   for (const XQueryTypeID type : dateTypes) {
     const Ref<XQueryDate> date = parse(type, texts[type - 16]);
     EXPECT_EQ(XQueryObjectTypeID(date.get()), type);
@@ -394,8 +395,9 @@ TEST(XQueryDate, ItsTypeIsNamedAndItsTextPublished) {
 TEST(XQueryDateCast, ClearsTheFieldsThatTheTargetDoesNotHave) {
   const Ref<XQueryDate> date = parse(21, "2004-02-29T12:30:45.5+02:00");
   const std::pair<XQueryTypeID, const char*> rows[] = {
-      {16, "2004-2-1 0:0:0.000000"},  {17, "2004-1-1 0:0:0.000000"}, {18, "0-2-29 0:0:0.000000"},
-      {19, "0-1-29 0:0:0.000000"},    {20, "0-2-1 0:0:0.000000"},    {22, "2004-2-29 0:0:0.000000"},
+      {16, "2004-2-1 0:0:0.000000"},   {17, "2004-1-1 0:0:0.000000"},
+      {18, "0-2-29 0:0:0.000000"},     {19, "0-1-29 0:0:0.000000"},
+      {20, "0-2-1 0:0:0.000000"},      {22, "2004-2-29 0:0:0.000000"},
       {23, "-1-11-30 12:30:45.500000"}};
   for (const auto& [type, fields] : rows) {
     const Ref<XQueryDate> cast = date->castToType(type);
@@ -418,8 +420,9 @@ TEST(XQueryDateCast, IsTheValueThatItsTextReads) {
 }
 
 TEST(XQueryDateCast, OnlyWhatHasTheFieldsCanBeCast) {
-  const char* const texts[] = {"2004-05", "2004", "--05-06", "---06", "--05--",
-                               "2004-05-06T01:02:03", "2004-05-06", "01:02:03"};
+  const char* const texts[] = {"2004-05",    "2004",    "--05-06",
+                               "---06",      "--05--",  "2004-05-06T01:02:03",
+                               "2004-05-06", "01:02:03"};
   for (const XQueryTypeID from : dateTypes) {
     for (XQueryTypeID to = 0; to < 60; ++to) {
       const bool toFragment = to >= 16 && to <= 20 && (from == 21 || from == 22);
@@ -484,8 +487,7 @@ TEST_F(LocalDates, WithoutAZoneTheLocalClockShowsTheFields) {
                  "2024-7-15 4:0:0.000000 2024-07-15");
   EXPECT_IN_ZONE("Asia/Kathmandu", comparedInGMT(23, "12:00:00"),
                  "-1-11-30 6:15:0.000000 12:00:00");
-  EXPECT_IN_ZONE("America/New_York", comparedInGMT(17, "2024"),
-                 "2024-1-1 5:0:0.000000 2024");
+  EXPECT_IN_ZONE("America/New_York", comparedInGMT(17, "2024"), "2024-1-1 5:0:0.000000 2024");
 }
 
 TEST_F(LocalDates, ThePresentShowsTheLocalOffset) {

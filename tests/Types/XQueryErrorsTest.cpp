@@ -37,8 +37,6 @@ const Row rows[] = {
     row(XQueryErrors::notANumber, 6, "not a numeric type - %@"),
     row(XQueryErrors::notAnInteger, 6, "not a integer type - %@"),
     row(XQueryErrors::valueOfAnotherType, 6, "value does not match a required type"),
-    row(XQueryErrors::unavailableType, 6,
-        "dates, times and durations are not available in this build"),
     row(XQueryErrors::divideByZero, 6, "divide by zero"),
     row(XQueryErrors::divisionByZero, 6, "Division by zero"),
     row(XQueryErrors::undefinedVariable, 8, "reference to undefined variable \"%@\""),
