@@ -1,8 +1,9 @@
 // xquery_bench [--factor=F] [--scaling] [Google Benchmark options]
 //
-// Measures the tree build and a table of paths over auction data, each beside the peer's figure
-// from the same run. The factor may also come from XQUERY_BENCH_FACTOR; 0.1 (about 11 MB) is the
-// default. Before a path is measured, both sides must agree on the number of nodes it selects.
+// Measures the tree build, a table of paths, each beside the peer's figure from the same run, and
+// the queries of bench/queries over auction data. The factor may also come from
+// XQUERY_BENCH_FACTOR; 0.1 (about 11 MB) is the default. Before a path is measured, both sides must
+// agree on the number of nodes it selects.
 #include "AuctionData.h"
 #include "Engine.h"
 #include "Peer.h"
@@ -13,7 +14,11 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
 #include <malloc.h>
+#include <map>
 #include <memory>
 #include <optional>
 #include <string>
@@ -141,6 +146,24 @@ void runPeer(benchmark::State& state, const Row& row) {
   setCounters(state, row, selected);
 }
 
+// One of the queries in bench/queries, by the name of its file.
+void runAuctionQuery(benchmark::State& state, const std::string& text) {
+  const auto query = bench::compile(text);
+  const auto context = XQueryContext::xqueryContext();
+  size_t selected = 0;
+  for (auto _ : state) selected = bench::evaluate(*context, *query, inputs.document);
+  state.counters["items"] = static_cast<double>(selected);
+}
+
+std::map<std::string, std::string> auctionQueries() {
+  std::map<std::string, std::string> queries;
+  for (const auto& entry : std::filesystem::directory_iterator(XQUERY_BENCH_QUERIES)) {
+    std::ifstream file(entry.path(), std::ios::binary);
+    queries[entry.path().stem().string()].assign(std::istreambuf_iterator<char>(file), {});
+  }
+  return queries;
+}
+
 void registerAll() {
   const auto add = [](const std::string& name, auto&&... arguments) {
     benchmark::RegisterBenchmark(name.c_str(), arguments...)->Unit(benchmark::kMillisecond);
@@ -154,6 +177,7 @@ void registerAll() {
     add(name, runEngine, row);
     if (row.peer) add(name + " peer", runPeer, row);
   }
+  for (const auto& [name, text] : auctionQueries()) add("query " + name, runAuctionQuery, text);
 }
 
 // Takes our own options out of the arguments. Empty when one is wrong.
