@@ -11,13 +11,18 @@
 // The trail knows what was visited as
 //
 //   an interval of the document   descendant, descendant-or-self, following
-//   the latest context item       preceding
+//   the latest context item       preceding, ancestor, ancestor-or-self
 //   one context item per parent   following-sibling, preceding-sibling
-//   a set of nodes                ancestor, ancestor-or-self (an ancestor met before ends the walk,
-//                                 since everything above it was met then), parent
+//   a set of nodes                parent
 //
-// and walks the other axes as they are; they overlap only where context items are the same. Most
-// steps have one context item in an evaluation, for which nothing is allocated.
+// and walks the other axes as they are; they overlap only where context items are the same. What it
+// knows is made for context items in document order, the usual case; in another order some nodes
+// may be visited again. Most steps have one context item in an evaluation, for which nothing is
+// allocated.
+//
+// Two context items in document order have in common, of what is above them, the ancestors of the
+// later one that do not come after the earlier one: an ancestor's subtree is one stretch of the
+// document, so if it begins before the earlier item and holds the later one, it holds both.
 //
 // A trail holds nodes without keeping their trees alive, and is used with one axis.
 #pragma once
@@ -44,11 +49,11 @@ class XQueryAxisTrail {
         if (isProperty(node)) return static_cast<void>(visit(node));
         return walkInterval(node, XQueryDescendantStop(node), visit);
       case XQueryAxisFollowing:
-        return walkInterval(XQueryFollowingStart(node), nullptr, visit);
+        return walkFollowing(node, visit);
       case XQueryAxisFollowingSibling:
         return walkFollowingSiblings(node, visit);
       case XQueryAxisAncestor:
-        return walkAncestors(node->parent(), visit);
+        return walkAncestors(node, false, visit);
       case XQueryAxisParent:
         return walkParent(node->parent(), visit);
       case XQueryAxisPreceding:
@@ -56,7 +61,7 @@ class XQueryAxisTrail {
       case XQueryAxisPrecedingSibling:
         return walkPrecedingSiblings(node, visit);
       case XQueryAxisAncestorOrSelf:
-        return walkAncestors(node, visit);
+        return walkAncestors(node, true, visit);
       default:
         return XQueryWalkAxis(node, axis, visit);
     }
@@ -95,17 +100,38 @@ class XQueryAxisTrail {
     if (endsLater) XQueryWalkNodes(oldStop, stop, visit);
   }
 
+  // The latest context item if `node` is in its tree and does not come before it, else null. It is
+  // the latest one from now on, unless it comes before that.
+  const NSXMLNode* contextUpTo(NSXMLNode* node) {
+    NSXMLNode* const earlier = _context;
+    if (earlier && NSXMLNode::haveComparableOrder(earlier, node)) {
+      if (node->orderNumber() < earlier->orderNumber()) return nullptr;
+      _context = node;
+      return earlier;
+    }
+    _context = node;
+    return nullptr;
+  }
+  static bool isAfter(const NSXMLNode* node, const NSXMLNode* context) {
+    return !context || node->orderNumber() > context->orderNumber();
+  }
+
+  // What follows an ancestor of the earlier item follows that item as well.
   template <class Visit>
-  void walkAncestors(NSXMLNode* first, Visit& visit) {
-    if (!first) return;
-    if (!_first) {
-      _first = first;
-      return XQueryWalkAncestors(first, visit);
+  void walkFollowing(NSXMLNode* node, Visit& visit) {
+    const NSXMLNode* earlier = contextUpTo(node);
+    for (NSXMLNode* at = node; at && isAfter(at, earlier); at = at->parent()) {
+      if (NSXMLNode* sibling = at->nextSibling()) return walkInterval(sibling, nullptr, visit);
     }
-    if (_visited.isEmpty()) {
-      for (const NSXMLNode* node = _first; node; node = node->parent()) _visited.insert(node);
-    }
-    for (NSXMLNode* node = first; node && _visited.insert(node); node = node->parent()) visit(node);
+  }
+
+  template <class Visit>
+  void walkAncestors(NSXMLNode* node, bool andSelf, Visit& visit) {
+    const NSXMLNode* earlier = contextUpTo(node);
+    NSXMLNode* at = andSelf ? node : node->parent();
+    for (; at && isAfter(at, earlier); at = at->parent()) visit(at);
+    // Its own walk did not visit the earlier item.
+    if (at && at == earlier && !andSelf) visit(at);
   }
 
   template <class Visit>
@@ -155,30 +181,32 @@ class XQueryAxisTrail {
     }
   }
 
-  // What precedes an earlier node precedes a later one as well, and so do the ancestors of the
-  // earlier node that are not above the later one.
+  // What precedes the earlier item precedes the later one as well, and so do the ancestors of the
+  // earlier one that are not above the later one.
   template <class Visit>
   void walkPreceding(NSXMLNode* node, Visit& visit) {
     if (!node || !node->parent()) return;
-    NSXMLNode* const walked = _first;
-    if (!walked || !NSXMLNode::haveComparableOrder(walked, node)) {
-      _first = node;
-      return XQueryWalkPreceding(node, visit);
+    NSXMLNode* const latest = _context;
+    const NSXMLNode* earlier = contextUpTo(node);
+    const bool isCovered = earlier == node || (!earlier && _context == latest);
+    if (isCovered) return;
+    if (!earlier) return XQueryWalkPreceding(node, visit);
+    std::vector<NSXMLNode*> above;
+    NSXMLNode* common = node->parent();
+    for (; isAfter(common, earlier); common = common->parent()) above.push_back(common);
+    if (common == earlier) {
+      above.push_back(common);
+    } else {
+      std::vector<NSXMLNode*> left;
+      for (NSXMLNode* at = earlier->parent(); at != common; at = at->parent()) left.push_back(at);
+      for (; !left.empty(); left.pop_back()) visit(left.back());
     }
-    if (!isBefore(walked, node)) return;
-    _first = node;
-    std::vector<NSXMLNode*> left = XQueryAncestors(walked);
-    std::vector<NSXMLNode*> above = XQueryAncestors(node);
-    while (!left.empty() && !above.empty() && left.back() == above.back()) {
-      left.pop_back();
-      above.pop_back();
-    }
-    for (; !left.empty(); left.pop_back()) visit(left.back());
-    XQueryWalkNodesExcept(walked, node, std::move(above), visit);
+    XQueryWalkNodesExcept(latest, node, std::move(above), visit);
   }
 
-  NSXMLNode* _first = nullptr;  // where the interval begins, or the first or latest context item
-  NSXMLNode* _stop = nullptr;   // where the interval ends
+  NSXMLNode* _context = nullptr;  // the latest context item
+  NSXMLNode* _first = nullptr;    // where the interval begins, or the first context item or parent
+  NSXMLNode* _stop = nullptr;     // where the interval ends
   XQueryIdentitySet _visited;
   std::unique_ptr<ContextByParent> _contexts;  // for parents other than that of `_first`
 };

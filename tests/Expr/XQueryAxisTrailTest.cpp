@@ -83,7 +83,7 @@ TEST(AxisTrail, VisitsNoNodeTwiceForItemsInDocumentOrder) {
     PathGenerator generate(seed);
     const auto document = generate.document();
     NodeList items;
-    for (NSXMLNode* node = document.get(); node; node = node->nextNode()) {
+    for (NSXMLNode* node : PathGenerator::allNodes(document.get())) {
       if (generate.oneIn(2)) items.push_back(node);
     }
     for (int axis = 1; axis <= 12; ++axis) {

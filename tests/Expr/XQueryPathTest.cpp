@@ -482,6 +482,8 @@ TEST_F(OverlappingAxes, OfNestedElements) {
     EXPECT_EQ(foundFromEvery(deep, step(XQueryAxisDescendant, anyName())), count - 1U);
     EXPECT_EQ(foundFromEvery(deep, step(XQueryAxisAncestor, anyName())), count - 1U);
     EXPECT_EQ(foundFromEvery(deep, step(XQueryAxisAncestorOrSelf, anyNode())), count + 1U);
+    EXPECT_EQ(foundFromEvery(deep, step(XQueryAxisFollowing, anyNode())), 0U);
+    EXPECT_EQ(foundFromEvery(deep, step(XQueryAxisPreceding, anyNode())), 0U);
   }
 }
 
