@@ -16,4 +16,7 @@ Value fn_name(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_local_name(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_root(const Value* arguments, size_t count, XQueryContext& context);
 
+// What fn:number of one item is, without a shortcut for texts that are no numbers.
+Value XQueryDoubleOrNaN(const Value& item, XQueryContext& context);
+
 }  // namespace xquery

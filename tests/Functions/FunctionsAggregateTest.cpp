@@ -49,6 +49,19 @@ TEST(Sum, ANaNIsTheAnswerAtOnce) {
 TEST(Sum, DurationsCountAsNumbers) {
   EXPECT_EQ(call(fn_sum, {months(14)}), "yearMonthDuration P1Y2M");
   EXPECT_EQ(call(fn_sum, {seconds(61)}), "dayTimeDuration PT1M1S");
+  EXPECT_EQ(call(fn_sum, {sequence({months(1), months(13)})}), "yearMonthDuration P1Y2M");
+  EXPECT_EQ(call(fn_sum, {sequence({seconds(60), seconds(1)})}), "dayTimeDuration PT1M1S");
+}
+
+TEST(Sum, ADateMayComeFirst) {
+  const Value date = typed(XQueryTypeDate, "2004-10-29");
+  EXPECT_EQ(call(fn_sum, {date}), "date 2004-10-29");
+  EXPECT_EQ(call(fn_sum, {sequence({date, seconds(86400)})}), "date 2004-10-30");
+  EXPECT_EQ(call(fn_sum, {sequence({date, date})}), "error 6 invalid type for operator");
+}
+
+TEST(Sum, AGeneralDurationIsRefused) {
+  EXPECT_EQ(call(fn_sum, {typed(XQueryTypeDuration, "P1Y")}), "null");
 }
 
 TEST(Sum, AFirstItemThatCannotBeSummedIsRefused) {

@@ -3,6 +3,9 @@
 #include "xquery/Data.h"
 #include "xquery/URL.h"
 
+#include <array>
+#include <random>
+
 namespace xquery {
 namespace {
 
@@ -112,6 +115,24 @@ TEST(NumberFunction, OfAURIIsTheErrorThatItsCastAnswers) {
             "record 6 value does not match a required type");
   EXPECT_EQ(answer("number(xs:anyURI('urn:x'))"),
             "error 6 line 0 value does not match a required type");
+}
+
+TEST(NumberFunction, OfATextIsWhatItsCastAnswersOrNaN) {
+  constexpr std::string_view alphabet = "0123456789.+-eE NaINFx\t";
+  std::mt19937 random(7);
+  const auto context = XQueryContext::xqueryContext();
+  for (int round = 0; round < 20000; ++round) {
+    std::string text;
+    for (size_t length = random() % 6; length > 0; --length) {
+      text += alphabet[random() % alphabet.size()];
+    }
+    if (random() % 50 == 0) text = std::array{"NaN", "INF", "-INF", "+INF"}[random() % 4];
+    const Value argument = random() % 2 ? string(text) : untyped(text);
+    const Value answer = fn_number(&argument, 1, *context);
+    const Value plain = XQueryDoubleOrNaN(argument, *context);
+    ASSERT_EQ(show(answer), show(plain)) << text;
+    ASSERT_EQ(XQueryNumber::isSpecial(answer.get()), XQueryNumber::isSpecial(plain.get())) << text;
+  }
 }
 
 TEST(NumberFunction, TakesUpToOneArgument) {

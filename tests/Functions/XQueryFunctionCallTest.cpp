@@ -7,7 +7,9 @@
 #include "Functions/XQueryFunctionCall.h"
 #include "Prolog/PrologTesting.h"
 
+#include <algorithm>
 #include <functional>
+#include <pthread.h>
 
 namespace xquery {
 namespace {
@@ -377,6 +379,46 @@ TEST(Recursion, AfterItsErrorTheContextWorksOn) {
     EXPECT_FALSE(context->evaluateXQuery(*endless, {}, nullptr));
     EXPECT_EQ(functiontest::show(context->evaluateXQuery(*sound, {}, nullptr)), "(integer 2)");
   }
+}
+
+// What the query answers on a thread with a stack of that many bytes.
+std::string answerOnStack(size_t bytes, const std::string& query) {
+  struct Job {
+    const std::string& query;
+    std::string result;
+  } job{query, {}};
+  const auto run = [](void* argument) -> void* {
+    auto* theJob = static_cast<Job*>(argument);
+    theJob->result = answer(theJob->query);
+    return nullptr;
+  };
+  pthread_attr_t attributes;
+  pthread_attr_init(&attributes);
+  pthread_attr_setstacksize(&attributes, bytes);
+  pthread_t thread;
+  const int failure = pthread_create(&thread, &attributes, run, &job);
+  pthread_attr_destroy(&attributes);
+  if (failure != 0) return "no thread";
+  pthread_join(thread, nullptr);
+  return job.result;
+}
+
+constexpr const char* counting =
+    "declare function local:count($n) { if ($n = 0) then 0 else 1 + local:count($n - 1) };";
+
+TEST(Recursion, AHundredThousandLevelsFitAGibibyteOfStack) {
+  EXPECT_EQ(answerOnStack(size_t{1} << 30, std::string(counting) + "local:count(100000)"),
+            "integer 100000");
+}
+
+TEST(Recursion, AThousandLevelsFitTheUsualStack) {
+  EXPECT_EQ(answerOnStack(size_t{8} << 20, std::string(counting) + "local:count(1000)"),
+            "integer 1000");
+}
+
+TEST(Recursion, WithoutAnEndIsAnErrorOnASmallStackToo) {
+  EXPECT_EQ(answerOnStack(size_t{1} << 20, std::string(counting) + "local:count(-1)"),
+            "error 0 line 0 limit: expression nested too deeply");
 }
 
 // How far apart on the native stack two levels of a recursion are.

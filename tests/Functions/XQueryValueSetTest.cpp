@@ -48,6 +48,17 @@ std::vector<Value> somewhatAlike() {
                                months(1),
                                seconds(1),
                                typed(XQueryTypeFloat, "INF"),
+                               typed(XQueryTypeDate, "2004-10-29Z"),
+                               typed(XQueryTypeDate, "2004-10-29"),
+                               typed(XQueryTypeDateTime, "2004-10-29T00:00:00Z"),
+                               typed(XQueryTypeDateTime, "2004-10-29T02:00:00+02:00"),
+                               typed(XQueryTypeDateTime, "2004-10-28T23:00:00-01:00"),
+                               typed(XQueryTypeTime, "12:00:00Z"),
+                               typed(XQueryTypeTime, "13:00:00+01:00"),
+                               typed(XQueryTypeGYear, "2004"),
+                               typed(XQueryTypeDuration, "P1M"),
+                               typed(XQueryTypeDuration, "P0Y1M"),
+                               typed(XQueryTypeDuration, "PT1S"),
                                NSNumber::numberWithLongLong(2),
                                NSNumber::numberWithDouble(2)};
   constexpr int64_t beyondDouble = int64_t{1} << 53;
