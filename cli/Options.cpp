@@ -88,9 +88,6 @@ void interpret(const CLI::App& app, const RawOptions& raw, Options& options) {
   for (Binding& binding : splitBindings("--namespace", raw.namespaces)) {
     options.namespaces[binding.name] = binding.value;
   }
-  if (options.html) {
-    throw CLI::ValidationError("--html", "HTML input is not available in this build");
-  }
 }
 
 }  // namespace

@@ -53,9 +53,12 @@ Ref<NSString> queryText(const Options& options) {
   return text;
 }
 
-Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path) {
+enum class Markup { XML, HTML };
+
+Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path, Markup markup) {
   NSXMLParseError error;
-  const uint32_t mode = options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
+  uint32_t mode = options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
+  if (markup == Markup::HTML) mode |= NSXMLDocumentTidyHTML;
   Ref<NSXMLDocument> document = NSXMLDocument::documentWithFile(path, mode, &error);
   if (document) return document;
   const std::string name = path == "-" ? "standard input" : path;
@@ -72,7 +75,7 @@ XQueryConstants bindConstants(const Options& options) {
     constants[binding.name] = value;
   }
   for (const Binding& binding : options.documents) {
-    constants[binding.name] = readDocument(options, binding.value);
+    constants[binding.name] = readDocument(options, binding.value, Markup::XML);
   }
   return constants;
 }
@@ -149,7 +152,10 @@ void runPhases(const Options& options) {
   const Ref<XQuery> query = phases.compile.measure([&] { return compile(source); });
   Value contextItem;
   const XQueryConstants constants = phases.parse.measure([&] {
-    if (options.input) contextItem = readDocument(options, *options.input);
+    if (options.input) {
+      contextItem =
+          readDocument(options, *options.input, options.html ? Markup::HTML : Markup::XML);
+    }
     return bindConstants(options);
   });
   const Ref<XQueryContext> context = XQueryContext::xqueryContextWithNamespaces(options.namespaces);

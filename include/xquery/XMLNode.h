@@ -296,6 +296,12 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
   // tag by some 45,000; depth and the length of texts (below 4 Gi units) by memory only. Without
   // NSXMLNodePreserveWhitespace a text of white space only is dropped unless xml:space says
   // preserve.
+  //
+  // With NSXMLDocumentTidyHTML the bytes are HTML of any quality, in the encoding that they name.
+  // What is missing is added: there is always html, head and body. Names are in lower case,
+  // elements in the XHTML namespace, svg and math in their own. Nesting of more than some tens of
+  // thousands of levels, a tag of more than 20,000 attributes, and a text that takes time or memory
+  // out of all proportion are refused, with 0 as the line.
   [[nodiscard]] static Ref<NSXMLDocument> documentWithData(std::string_view bytes, uint32_t options,
                                                            NSXMLParseError* error = nullptr);
   // Reads the file in pieces (`-` is standard input). `error->line` is 0 when it cannot be read.

@@ -5,6 +5,7 @@
 // Names are looked up by the addresses of libxml2's texts, which are equal for equal names within
 // one document, so that the process's table of names is asked once per name and document.
 #include "Platform/LibXML.h"
+#include "Platform/Tidy.h"
 #include "Platform/UTF8.h"
 #include "Platform/XMLNames.h"
 #include "Platform/XMLTreeBuilder.h"
@@ -321,6 +322,26 @@ Ref<NSXMLDocument> parse(const LibXMLReader& read, uint32_t options, size_t expe
   return handler.finish();
 }
 
+Ref<NSXMLDocument> parseHTML(std::string_view bytes, uint32_t options, NSXMLParseError& error) {
+  std::string failure;
+  const auto XHTML = XHTMLFromHTML(bytes, failure);
+  if (!XHTML) {
+    error = {failure, 0, 0};
+    return nullptr;
+  }
+  return NSXMLDocument::documentWithData(*XHTML, options & ~uint32_t{NSXMLDocumentTidyHTML},
+                                         &error);
+}
+
+std::string readAll(const LibXMLReader& read) {
+  std::string bytes;
+  std::vector<char> piece(size_t{64} * 1024);
+  for (ptrdiff_t count = 0; (count = read(piece.data(), piece.size())) > 0;) {
+    bytes.append(piece.data(), static_cast<size_t>(count));
+  }
+  return bytes;
+}
+
 // An open file, closed at the end unless it is standard input.
 class InputFile {
  public:
@@ -382,6 +403,7 @@ Ref<NSXMLDocument> unreadable(const std::string& path, int failure, NSXMLParseEr
 Ref<NSXMLDocument> NSXMLDocument::documentWithData(std::string_view bytes, uint32_t options,
                                                    NSXMLParseError* error) {
   NSXMLParseError ignored;
+  if (options & NSXMLDocumentTidyHTML) return parseHTML(bytes, options, error ? *error : ignored);
   size_t at = 0;
   const LibXMLReader read = [&](char* buffer, size_t size) {
     const size_t count = std::min(size, bytes.size() - at);
@@ -400,6 +422,11 @@ Ref<NSXMLDocument> NSXMLDocument::documentWithFile(const std::string& path, uint
   if (!file.isOpen()) return unreadable(path, errno, reported);
   PieceReader pieces(file);
   const LibXMLReader read = [&](char* buffer, size_t size) { return pieces.read(buffer, size); };
+  if (options & NSXMLDocumentTidyHTML) {
+    const std::string bytes = readAll(read);
+    if (file.failure()) return unreadable(path, file.failure(), reported);
+    return parseHTML(bytes, options, reported);
+  }
   constexpr size_t firstBlock = 4096;
   Ref<NSXMLDocument> document = parse(read, options, firstBlock, reported);
   if (!document && file.failure()) return unreadable(path, file.failure(), reported);

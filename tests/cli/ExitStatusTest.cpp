@@ -82,22 +82,21 @@ TEST_P(Usage, IsTwoWithAnExplanation) {
 
 INSTANTIATE_TEST_SUITE_P(
     Wrong, Usage,
-    testing::Values(
-        WrongUsage{"UnknownOption", {"--bogus", "-e", "1"}, "--bogus"},
-        WrongUsage{"NoQuery", {}, "QUERYFILE"},
-        WrongUsage{"TooManyArguments", {"a.xq", "b.xml", "c"}, "c"},
-        WrongUsage{"TooManyArgumentsWithText", {"-e", "1", "b.xml", "c"}, "c"},
-        WrongUsage{"TextWithoutText", {"-e"}, "-e"},
-        WrongUsage{"TextTwice", {"-e", "1", "-e", "2"}, "-e"},
-        WrongUsage{"VariableWithoutValue", {"--var", "x", "-e", "1"}, "--var"},
-        WrongUsage{"VariableWithoutName", {"--var", "=x", "-e", "1"}, "--var"},
-        WrongUsage{"DocumentWithoutFile", {"--doc", "d", "-e", "1"}, "--doc"},
-        WrongUsage{"NamespaceWithoutURI", {"--namespace", "p", "-e", "1"}, "--namespace"},
-        WrongUsage{"VariableNotUTF8", {"--var", "x=\xff", "-e", "1"}, "not UTF-8"},
-        WrongUsage{"RepeatZero", {"--repeat", "0", "-e", "1"}, "--repeat"},
-        WrongUsage{"RepeatNegative", {"--repeat", "-3", "-e", "1"}, "--repeat"},
-        WrongUsage{"RepeatNoNumber", {"--repeat", "often", "-e", "1"}, "--repeat"},
-        WrongUsage{"HTMLNotAvailable", {"--html", "-e", "1"}, "HTML input is not available"}),
+    testing::Values(WrongUsage{"UnknownOption", {"--bogus", "-e", "1"}, "--bogus"},
+                    WrongUsage{"NoQuery", {}, "QUERYFILE"},
+                    WrongUsage{"TooManyArguments", {"a.xq", "b.xml", "c"}, "c"},
+                    WrongUsage{"TooManyArgumentsWithText", {"-e", "1", "b.xml", "c"}, "c"},
+                    WrongUsage{"TextWithoutText", {"-e"}, "-e"},
+                    WrongUsage{"TextTwice", {"-e", "1", "-e", "2"}, "-e"},
+                    WrongUsage{"VariableWithoutValue", {"--var", "x", "-e", "1"}, "--var"},
+                    WrongUsage{"VariableWithoutName", {"--var", "=x", "-e", "1"}, "--var"},
+                    WrongUsage{"DocumentWithoutFile", {"--doc", "d", "-e", "1"}, "--doc"},
+                    WrongUsage{
+                        "NamespaceWithoutURI", {"--namespace", "p", "-e", "1"}, "--namespace"},
+                    WrongUsage{"VariableNotUTF8", {"--var", "x=\xff", "-e", "1"}, "not UTF-8"},
+                    WrongUsage{"RepeatZero", {"--repeat", "0", "-e", "1"}, "--repeat"},
+                    WrongUsage{"RepeatNegative", {"--repeat", "-3", "-e", "1"}, "--repeat"},
+                    WrongUsage{"RepeatNoNumber", {"--repeat", "often", "-e", "1"}, "--repeat"}),
     [](const auto& parameter) { return parameter.param.name; });
 
 // --- input that cannot be read or parsed
@@ -122,6 +121,27 @@ TEST(ExitStatus, AQueryFileThatIsNotUTF8IsThree) {
   EXPECT_EQ(outcome.status, 3);
   EXPECT_EQ(outcome.out, "");
   EXPECT_THAT(outcome.err, HasSubstr("latin1.xq: not UTF-8 text"));
+}
+
+TEST(ExitStatus, HTMLThatIsRefusedIsThree) {
+  std::string tags;
+  for (int n = 0; n < 1'000'000; ++n) tags += "<b>";
+  const Outcome outcome = xquery({"--html", "-e", "1", "-"}, tags);
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_EQ(outcome.err, "xquery: standard input: HTML nested too deeply\n");
+  const Outcome missing = xquery({"--html", "-e", "1", "/nowhere/input.html"});
+  EXPECT_EQ(missing.status, 3);
+  EXPECT_THAT(missing.err, HasSubstr("/nowhere/input.html: No such file or directory"));
+}
+
+TEST(ExitStatus, AModuleThatCannotBeLoadedIsOne) {
+  const Outcome outcome = xquery({"-e",
+                                  "import module namespace m = 'urn:m' at "
+                                  "'file:///nowhere/m.xq', 'm.xq'; 1"});
+  EXPECT_EQ(outcome.status, 1);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, HasSubstr("can't access module for "));
 }
 
 TEST(ExitStatus, AMissingInputIsThree) {

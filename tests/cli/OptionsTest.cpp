@@ -133,6 +133,41 @@ TEST(Options, TimeReportsEachPhaseOnStandardError) {
                                         "evaluate +[0-9.]+ ms\nprint +[0-9.]+ ms\n"));
 }
 
+TEST(Options, HTMLIsTidied) {
+  EXPECT_EQ(
+      xquery({"--html", "-e", "/html:html/html:body/html:p[2]/text()", "-"}, "<p>a<p>b<br>").out,
+      "b\n");
+  const TemporaryDirectory directory;
+  const std::string file = directory.write("page.html", "<title>A &amp; B</title>");
+  EXPECT_EQ(xquery({"--html", "-e", "//html:title/text()", file}).out, "A &amp; B\n");
+}
+
+TEST(Options, HTMLKeepsWhiteSpaceUnlessItIsToBeStripped) {
+  const std::string page = "<p><b>x</b> <i>y</i>";
+  EXPECT_EQ(xquery({"--html", "-e", "//html:p/text()", "-"}, page).out, " \n");
+  EXPECT_EQ(xquery({"--html", "--strip-space", "-e", "//html:p/text()", "-"}, page).out, "");
+}
+
+TEST(Options, DocumentsOfVariablesAreXmlEvenThen) {
+  const TemporaryDirectory directory;
+  const std::string document = directory.write("d.xml", "<p/>");
+  EXPECT_EQ(
+      xquery({"--html", "--doc", "d=" + document, "-e", "declare variable $d external; $d/p", "-"},
+             "<p>a")
+          .out,
+      "<p/>\n");
+}
+
+TEST(Options, ModulesAreReadFromFiles) {
+  const TemporaryDirectory directory;
+  const std::string module =
+      directory.write("m.xq", "module namespace m = 'urn:m'; declare variable $m:a := 41;");
+  EXPECT_EQ(
+      xquery({"-e", "import module namespace m = 'urn:m' at 'file://" + module + "'; $m:a + 1"})
+          .out,
+      "42\n");
+}
+
 TEST(Options, RepeatPrintsOnceAndTimesMedianAndMinimum) {
   const Outcome outcome =
       xquery({"--time", "--repeat", "5", "-e", "//price[. > 20]/text()", books()});

@@ -1,0 +1,455 @@
+// Documents and raw bodies of a context, and what a compilation may load.
+#include "Eval/XQueryContextInternal.h"
+#include "Expr/XQuerySequence.h"
+#include "Platform/HTTPServer.h"
+#include "Platform/LoadingTestSupport.h"
+#include "xquery/xquery.h"
+
+#include <gtest/gtest.h>
+
+#include <map>
+#include <string>
+#include <thread>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+using std::chrono::milliseconds;
+
+class Loading : public testing::Test {
+ protected:
+  XQueryContextInternal& internal() { return context->_internal(); }
+  // The document as XML, or "(empty)" when it cannot be had.
+  std::string document(const std::string& URL) {
+    const Value value = internal().XQueryDocumentForURL(URLOf(URL));
+    if (isNull(value)) return "(empty)";
+    const auto* parsed = dyn_cast<NSXMLDocument>(value);
+    return parsed ? parsed->rootElement()->XMLString()->utf8() : "(no document)";
+  }
+  std::string body(const std::string& URL) {
+    const auto data = internal().URLBody(URLOf(URL));
+    return data ? std::string(data->bytes()) : "(none)";
+  }
+  void setPolicy(XQueryLoadingPolicy policy) {
+    XQueryLoading loading;
+    loading.policy = std::move(policy);
+    context->contextSetLoading(loading);
+  }
+
+  HTTPServer server;
+  TestFolder folder;
+  Ref<XQueryContext> context = XQueryContext::xqueryContext();
+};
+
+// --- documents -----------------------------------------------------------------------------------
+
+TEST_F(Loading, DocumentsComeFromFilesAndServers) {
+  EXPECT_EQ(document(folder.write("a.xml", "<a/>")), "<a/>");
+  server.answer("/b", "application/xml", "<b/>");
+  EXPECT_EQ(document(server.URL("/b")), "<b/>");
+}
+
+TEST_F(Loading, ADocumentIsFetchedOnceInTheLifeOfAContext) {
+  server.answer("/a", "application/xml", "<a/>");
+  const auto URL = server.URL("/a");
+  const Value first = internal().XQueryDocumentForURL(URLOf(URL));
+  const Value second = internal().XQueryDocumentForURL(URLOf(URL));
+  EXPECT_EQ(first, second);
+  EXPECT_EQ(server.requests("/a"), 1);
+  context = XQueryContext::xqueryContext();
+  EXPECT_EQ(document(URL), "<a/>");
+  EXPECT_EQ(server.requests("/a"), 2);
+}
+
+TEST_F(Loading, UrlsAreToldApartByTheirWholeText) {
+  server.answer("/a", "application/xml", "<a/>");
+  server.answer("/a?x", "application/xml", "<x/>");
+  EXPECT_EQ(document(server.URL("/a")), "<a/>");
+  EXPECT_EQ(document(server.URL("/a?x")), "<x/>");
+  EXPECT_EQ(document(server.URL("/a#part")), "<a/>");
+  EXPECT_EQ(server.requests("/a"), 2);
+}
+
+TEST_F(Loading, AFailureIsEmptyAndNeverTriedAgain) {
+  const auto URL = server.URL("/a");
+  EXPECT_EQ(document(URL), "(empty)");
+  server.answer("/a", "application/xml", "<a/>");
+  EXPECT_EQ(document(URL), "(empty)");
+  EXPECT_EQ(server.requests("/a"), 1);
+}
+
+struct StatusRow {
+  int status;
+  bool isUsed;
+};
+
+TEST_F(Loading, OnlyStatus200And304AreUsed) {
+  constexpr StatusRow rows[] = {{200, true},  {304, true},  {201, false}, {203, false},
+                                {206, false}, {300, false}, {302, false}, {400, false},
+                                {401, false}, {403, false}, {404, false}, {410, false},
+                                {500, false}, {503, false}};
+  // 304 never has a body on the wire.
+  class Answers : public XQueryLoader {
+   public:
+    std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose) override {
+      return XQueryResource{"<a/>", std::stoi(URL.path().substr(1)), "application/xml", {}};
+    }
+  };
+  XQueryLoading loading;
+  loading.loader = std::make_shared<Answers>();
+  context->contextSetLoading(loading);
+  for (const StatusRow& row : rows) {
+    EXPECT_EQ(document("http://h/" + std::to_string(row.status)), row.isUsed ? "<a/>" : "(empty)")
+        << row.status;
+  }
+  EXPECT_EQ(document("http://h/0"), "<a/>");
+}
+
+TEST_F(Loading, StatusesOfAServerAreFilteredAlike) {
+  for (const int status : {201, 404, 500}) {
+    const std::string path = "/" + std::to_string(status);
+    server.answer(path, status, "Content-Type: application/xml\r\n", "<a/>");
+    EXPECT_EQ(document(server.URL(path)), "(empty)") << status;
+    EXPECT_EQ(body(server.URL(path + "?body")), "(none)") << status;
+  }
+}
+
+TEST_F(Loading, TextThatIsNotWellFormedIsEmpty) {
+  EXPECT_EQ(document(folder.write("bad.xml", "<a><b></a>")), "(empty)");
+  EXPECT_EQ(document(folder.write("empty.xml", "")), "(empty)");
+}
+
+struct ModeRow {
+  const char* path;
+  const char* type;  // null for none
+  bool isHTML;
+};
+
+TEST_F(Loading, TypeAndPathDecideBetweenXmlAndHtml) {
+  constexpr ModeRow rows[] = {
+      {"/type/1", "text/html", true},  {"/type/2", "TEXT/Html; charset=utf-8", true},
+      {"/type/3", "text/htm", false},  {"/type/4", "application/xhtml+xml", false},
+      {"/type/5", nullptr, false},     {"/name.html", nullptr, true},
+      {"/name.htm", nullptr, true},    {"/NAME.HTM", nullptr, true},
+      {"/Name.Html", nullptr, true},   {"/name.html", "application/xml", true},
+      {"/name.xhtml", nullptr, false}, {"/html", nullptr, false},
+      {"/name.html/", nullptr, false}, {"/name?x.html", nullptr, false},
+      {"/name.html?x", nullptr, true}, {"/name.%68tml", nullptr, true},
+  };
+  for (const ModeRow& row : rows) {
+    const std::string header =
+        row.type ? std::string("Content-Type: ") + row.type + "\r\n" : std::string();
+    server.answer(row.path, 200, header, "<P>x</P>");
+    context = XQueryContext::xqueryContext();
+    const std::string expected =
+        row.isHTML ? "<html xmlns=\"http://www.w3.org/1999/xhtml\"><head><title/></head>"
+                     "<body><p>x</p></body></html>"
+                   : "<P>x</P>";
+    EXPECT_EQ(document(server.URL(row.path)), expected) << row.path;
+  }
+}
+
+TEST_F(Loading, AFileIsHtmlByItsName) {
+  EXPECT_NE(document(folder.write("a.HTM", "<p>x")), "(empty)");
+  EXPECT_EQ(document(folder.write("a.xml", "<p>x")), "(empty)");
+}
+
+// A relative reference without a path has no path to judge by.
+TEST_F(Loading, TheRelativePathIsWhatIsJudged) {
+  server.answer("/a.html?x", "application/xml", "<P/>");
+  const auto base = URLOf(server.URL("/a.html"));
+  const auto URL = NSURL::URLWithString(NSString::stringWithASCII("?x"), *base);
+  const Value value = internal().XQueryDocumentForURL(URL);
+  ASSERT_TRUE(isa<NSXMLDocument>(value));
+  EXPECT_EQ(cast<NSXMLDocument>(value)->rootElement()->XMLString()->utf8(), "<P/>");
+}
+
+TEST_F(Loading, WhiteSpaceOnlyTextIsDroppedAndCDATAKept) {
+  EXPECT_EQ(document(folder.write("a.xml",
+                                  "<a> <b/>\n<c xml:space='preserve'> </c>"
+                                  "<d><![CDATA[<x>]]></d> y </a>")),
+            "<a><b/><c xml:space=\"preserve\"> </c><d><![CDATA[<x>]]></d> y </a>");
+}
+
+TEST_F(Loading, ADocumentReportsTheUrlItWasAskedForBy) {
+  server.redirect("/a", "/b");
+  server.answer("/b", "application/xml", "<b/>");
+  const Value value = internal().XQueryDocumentForURL(URLOf(server.URL("/a")));
+  ASSERT_TRUE(isa<NSXMLDocument>(value));
+  EXPECT_EQ(cast<NSXMLDocument>(value)->documentURI()->utf8(), server.URL("/a"));
+}
+
+TEST_F(Loading, WhatNoLoaderCanReachIsEmpty) {
+  for (const auto* URL : {"", "a.xml", "ftp://127.0.0.1/a", "urn:a", "data:text/xml,<a/>"}) {
+    if (const auto parsed = URLOf(URL)) {
+      EXPECT_EQ(internal().XQueryDocumentForURL(parsed), NSNull::null()) << URL;
+    }
+  }
+}
+
+TEST_F(Loading, EndlessAndSlowDocumentsAreEmptyInTheEnd) {
+  XQueryLoading loading;
+  loading.limits.mostBytes = 1 << 20;
+  loading.limits.totalTimeout = milliseconds(300);
+  context->contextSetLoading(loading);
+  server.handle("/endless", [](HTTPServer::Connection& connection) {
+    connection.send("HTTP/1.1 200 Fine\r\n\r\n");
+    connection.pour();
+  });
+  server.handle("/slow", [](HTTPServer::Connection& connection) {
+    connection.send("HTTP/1.1 200 Fine\r\n\r\n");
+    connection.trickle();
+  });
+  EXPECT_EQ(document(server.URL("/endless")), "(empty)");
+  EXPECT_EQ(document(server.URL("/slow")), "(empty)");
+}
+
+TEST_F(Loading, ADocumentOutlivesItsContext) {
+  const Value value = internal().XQueryDocumentForURL(URLOf(folder.write("a.xml", "<a>x</a>")));
+  context = nullptr;
+  EXPECT_EQ(cast<NSXMLDocument>(value)->stringValue()->utf8(), "x");
+}
+
+// --- raw bodies ----------------------------------------------------------------------------------
+
+TEST_F(Loading, BodiesAreRawBytes) {
+  const std::string bytes("\xFF\0<a>", 5);
+  EXPECT_EQ(body(folder.write("a.xml", bytes)), bytes);
+  EXPECT_EQ(body(folder.write("empty", "")), "");
+  EXPECT_EQ(body(folder.URL("missing")), "(none)");
+}
+
+TEST_F(Loading, ABodyIsKeptByItsHandle) {
+  server.answer("/a", "text/plain", "x");
+  EXPECT_EQ(body(server.URL("/a")), "x");
+  EXPECT_EQ(body(server.URL("/a")), "x");
+  EXPECT_EQ(server.requests("/a"), 1);
+}
+
+TEST_F(Loading, ABodyThatFailedIsTriedAgain) {
+  EXPECT_EQ(body(server.URL("/a")), "(none)");
+  server.answer("/a", "text/plain", "x");
+  EXPECT_EQ(body(server.URL("/a")), "x");
+}
+
+TEST_F(Loading, WhatTheDocumentsHoldHasNoBody) {
+  server.answer("/a", "application/xml", "<a/>");
+  EXPECT_EQ(document(server.URL("/a")), "<a/>");
+  EXPECT_EQ(body(server.URL("/a")), "(none)");
+  EXPECT_EQ(document(server.URL("/missing")), "(empty)");
+  EXPECT_EQ(body(server.URL("/missing")), "(none)");
+  EXPECT_EQ(server.requests(), 2);
+}
+
+TEST_F(Loading, ABodyDoesNotSpareADocumentItsRequest) {
+  server.answer("/a", "application/xml", "<a/>");
+  EXPECT_EQ(body(server.URL("/a")), "<a/>");
+  EXPECT_EQ(document(server.URL("/a")), "<a/>");
+  EXPECT_EQ(server.requests("/a"), 2);
+}
+
+// --- policies ------------------------------------------------------------------------------------
+
+TEST_F(Loading, ThePolicyCoversDocumentsAndBodies) {
+  const auto file = folder.write("a.xml", "<a/>"), other = folder.write("b.xml", "<b/>");
+  server.answer("/a", "application/xml", "<a/>");
+  setPolicy(XQueryLoadingPolicy::denyAll());
+  EXPECT_EQ(document(file), "(empty)");
+  EXPECT_EQ(body(other), "(none)");
+  EXPECT_EQ(document(server.URL("/a")), "(empty)");
+  EXPECT_EQ(body(server.URL("/a?b")), "(none)");
+  EXPECT_EQ(server.requests(), 0);
+}
+
+TEST_F(Loading, AFailureUnderOnePolicyStaysUnderTheNext) {
+  const auto file = folder.write("a.xml", "<a/>"), other = folder.write("b.xml", "<b/>");
+  setPolicy(XQueryLoadingPolicy::denyAll());
+  EXPECT_EQ(document(file), "(empty)");
+  setPolicy(XQueryLoadingPolicy::allowAll());
+  EXPECT_EQ(document(file), "(empty)");
+  EXPECT_EQ(document(other), "<b/>");
+  setPolicy(XQueryLoadingPolicy::denyAll());
+  EXPECT_EQ(document(other), "<b/>");
+}
+
+TEST_F(Loading, ABodyIsSubjectToThePolicyOfTheDay) {
+  const auto file = folder.write("a.txt", "x");
+  EXPECT_EQ(body(file), "x");
+  setPolicy(XQueryLoadingPolicy::denyAll());
+  EXPECT_EQ(body(file), "(none)");
+}
+
+TEST_F(Loading, ADocumentMayNotReadBesideItself) {
+  folder.write("secret.txt", "secret");
+  EXPECT_EQ(document(folder.write("a.xml",
+                                  "<!DOCTYPE a [<!ENTITY s SYSTEM 'secret.txt'>]>"
+                                  "<a>&s;</a>")),
+            "(empty)");
+}
+
+// --- the host's loader ---------------------------------------------------------------------------
+
+class Archive : public XQueryLoader {
+ public:
+  std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose purpose) override {
+    const std::string text = URL.absoluteString()->utf8();
+    asked.push_back({text, purpose});
+    if (onLoad) onLoad();
+    const auto found = entries.find(text);
+    if (found == entries.end()) return std::nullopt;
+    return found->second;
+  }
+  std::map<std::string, XQueryResource> entries;
+  std::vector<std::pair<std::string, XQueryLoadPurpose>> asked;
+  std::function<void()> onLoad;
+};
+
+class HostLoading : public Loading {
+ protected:
+  void SetUp() override {
+    settings.loader = archive;
+    settings.policy = XQueryLoadingPolicy::denyAll().allowScheme("app");
+    context->contextSetLoading(settings);
+  }
+  std::shared_ptr<Archive> archive = std::make_shared<Archive>();
+  XQueryLoading settings;
+};
+
+TEST_F(HostLoading, GivesDocumentsModulesAndBodies) {
+  archive->entries["app:d"] = {"<p>x", {}, "text/html", {}};
+  archive->entries["app:b"] = {"bytes", {}, {}, {}};
+  archive->entries["app:m"] = {
+      "module namespace m = 'urn:m'; declare variable $m:a := 1;", {}, {}, {}};
+  EXPECT_NE(document("app:d"), "(empty)");
+  EXPECT_EQ(body("app:b"), "bytes");
+  const auto query = XQuery::xqueryWithSource(
+      std::string_view("import module namespace m = 'urn:m' at 'app:m'; $m:a"), settings);
+  const auto items = context->evaluateXQuery(*query, {}, {});
+  ASSERT_TRUE(items);
+  EXPECT_EQ(XQueryItemStringValue(*items->objectAtIndex(0)), "1");
+  const std::vector<std::pair<std::string, XQueryLoadPurpose>> expected = {
+      {"app:d", XQueryLoadPurpose::Document},
+      {"app:b", XQueryLoadPurpose::Body},
+      {"app:m", XQueryLoadPurpose::Module}};
+  EXPECT_EQ(archive->asked, expected);
+}
+
+TEST_F(HostLoading, MayChangeTheSettingsWhileItIsCalled) {
+  archive->entries["app:d"] = {"<d/>", {}, {}, {}};
+  archive->entries["app:b"] = {"b", {}, {}, {}};
+  archive->onLoad = [&] {
+    settings.loader = nullptr;
+    context->contextSetLoading(settings);
+  };
+  EXPECT_EQ(document("app:d"), "<d/>");
+  settings.loader = archive;
+  context->contextSetLoading(settings);
+  EXPECT_EQ(body("app:b"), "b");
+  EXPECT_FALSE(context->contextLoading().loader);
+}
+
+TEST_F(HostLoading, WhatItThrowsPassesThrough) {
+  struct Failure {};
+  archive->onLoad = [] { throw Failure(); };
+  EXPECT_THROW(document("app:d"), Failure);
+  EXPECT_THROW((void)XQuery::xqueryWithSource(
+                   std::string_view("import module 'urn:m' at 'app:m'; 1"), settings),
+               Failure);
+  archive->onLoad = nullptr;
+  archive->entries["app:d"] = {"<d/>", {}, {}, {}};
+  EXPECT_EQ(document("app:d"), "<d/>") << "a load that was broken off is no failure to remember";
+}
+
+// --- what a compilation may load -----------------------------------------------------------------
+
+class CompileLoading : public Loading {
+ protected:
+  static std::vector<int64_t> errors(const std::string& source, const XQueryLoading& loading) {
+    std::vector<int64_t> numbers;
+    const auto query = XQuery::xqueryWithSource(std::string_view(source), loading);
+    if (const auto found = query->parseErrors()) {
+      for (const Value& each : found->objects()) numbers.push_back(cast<XQueryError>(each)->err());
+    }
+    return numbers;
+  }
+  static std::string importOf(const std::string& URL) {
+    return "import module namespace m = 'urn:m' at '" + URL + "'; $m:a";
+  }
+  const std::string text = "module namespace m = 'urn:m'; declare variable $m:a := 1;";
+  const std::vector<int64_t> none, missing = {47, 8};
+  XQueryLoading loading;
+};
+
+TEST_F(CompileLoading, ModulesComeFromFilesAndServers) {
+  EXPECT_EQ(errors(importOf(folder.write("m.xq", text)), loading), none);
+  server.answer("/m", "text/html", text);
+  EXPECT_EQ(errors(importOf(server.URL("/m")), loading), none);
+  EXPECT_EQ(server.requests("/m"), 1);
+}
+
+TEST_F(CompileLoading, ThePolicyCoversModules) {
+  const auto file = folder.write("m.xq", text);
+  server.answer("/m", "text/plain", text);
+  loading.policy = XQueryLoadingPolicy::denyAll();
+  EXPECT_EQ(errors(importOf(file), loading).front(), 47);
+  EXPECT_EQ(errors(importOf(server.URL("/m")), loading).front(), 47);
+  EXPECT_EQ(server.requests(), 0);
+  loading.policy.allowFilesBelow(folder.path());
+  EXPECT_EQ(errors(importOf(file), loading), none);
+}
+
+TEST_F(CompileLoading, ThePolicyCoversTheModulesOfModules) {
+  const auto inner = folder.write("outside/i.xq", "module namespace i = 'urn:i';");
+  const auto outer =
+      folder.write("inside/m.xq", "module namespace m = 'urn:m'; import module 'urn:i' at '" +
+                                      inner + "'; declare variable $m:a := 1;");
+  EXPECT_EQ(errors(importOf(outer), loading), none);
+  loading.policy = XQueryLoadingPolicy::denyAll().allowFilesBelow(folder.path("inside"));
+  EXPECT_EQ(errors(importOf(outer), loading).front(), 47);
+}
+
+TEST_F(CompileLoading, AnAnswerOfAnotherStatusIsNoModule) {
+  server.answer("/m", 404, "", text);
+  EXPECT_EQ(errors(importOf(server.URL("/m")), loading).front(), 47);
+}
+
+TEST_F(CompileLoading, SettingsOfTheContextDoNotReachCompilation) {
+  setPolicy(XQueryLoadingPolicy::denyAll());
+  const auto query =
+      XQuery::xqueryWithSource(std::string_view(importOf(folder.write("m.xq", text))));
+  const auto items = context->evaluateXQuery(*query, {}, {});
+  ASSERT_TRUE(items);
+  EXPECT_EQ(XQueryItemStringValue(*items->objectAtIndex(0)), "1");
+}
+
+TEST_F(CompileLoading, OnlySoManyModulesAreFetched) {
+  const std::string source = "import module 'urn:a' at '" +
+                             folder.write("a.xq", "module namespace a = 'urn:a';") +
+                             "'; import module 'urn:b' at '" +
+                             folder.write("b.xq", "module namespace b = 'urn:b';") + "'; 1";
+  loading.limits.mostModules = 2;
+  EXPECT_EQ(errors(source, loading), none);
+  loading.limits.mostModules = 1;
+  EXPECT_EQ(errors(source, loading), std::vector<int64_t>{47});
+}
+
+TEST_F(CompileLoading, OtherThreadsCompileWhileAModuleIsFetched) {
+  std::atomic<bool> isCompiled = false;
+  server.handle("/m", [&](HTTPServer::Connection& connection) {
+    // The answer waits for the other compilation, which would wait for the lock if it were held.
+    for (int n = 0; n < 1000 && !isCompiled; ++n) std::this_thread::sleep_for(milliseconds(10));
+    connection.send("HTTP/1.1 200 Fine\r\nConnection: close\r\n\r\n" +
+                    std::string(isCompiled ? text : "late"));
+  });
+  std::thread other([&] {
+    while (server.requests("/m") == 0) std::this_thread::sleep_for(milliseconds(1));
+    EXPECT_FALSE(XQuery::xqueryWithSource("1 + 1")->parseErrors());
+    isCompiled = true;
+  });
+  EXPECT_EQ(errors(importOf(server.URL("/m")), loading), none);
+  other.join();
+}
+
+}  // namespace
+}  // namespace xquery
