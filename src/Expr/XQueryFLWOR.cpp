@@ -2,6 +2,7 @@
 
 #include "Eval/StackGuard.h"
 #include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryClauseItems.h"
 #include "Expr/XQueryFLWORSort.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryAtomization.h"
@@ -131,12 +132,12 @@ void XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toRe
 void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
                                   XQueryFLWORResults& toResults, XQueryContext& withContext) const {
   auto& dynamic = withContext._internal();
-  const Value value = flattened(clause.evaluateWithContext(withContext));
-  const XQueryItemList items(value.get());
+  const XQueryClauseItems items(clause.expr(), true, withContext);
   const bool isLast = index + 1 == _forLet.size();
   for (size_t k = 0; k < items.count(); ++k) {
-    checkType(clause, items[k], withContext);
-    dynamic.setVariable(items[k], clause.varID());
+    Value item = items[k];
+    checkType(clause, item.get(), withContext);
+    dynamic.setVariable(std::move(item), clause.varID());
     if (clause.posVarID()) {
       dynamic.setVariable(NSNumber::numberWithLongLong(static_cast<int64_t>(k) + 1),
                           clause.posVarID());

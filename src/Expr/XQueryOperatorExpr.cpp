@@ -194,26 +194,32 @@ Value XQueryOperatorExpr::answerFor(const Value& left, const Value& right,
 
 const XQueryOperatorExpr* XQueryOperatorExpr::rangeToCompareWith() const {
   if (operatorClassification(_type) != GeneralComparison) return nullptr;
-  const XQueryExpr* right = _right.get();
-  while (const auto* list = dyn_cast<XQueryExprList>(right)) {  // parentheses
+  return rangeIn(_right.get());
+}
+
+const XQueryOperatorExpr* XQueryOperatorExpr::rangeIn(const XQueryExpr* expr) {
+  while (const auto* list = dyn_cast<XQueryExprList>(expr)) {  // parentheses
     if (list->count() != 1) return nullptr;
-    right = list->objectAtIndex(0);
+    expr = list->objectAtIndex(0);
   }
-  const auto* range = dyn_cast<XQueryOperatorExpr>(right);
+  const auto* range = dyn_cast<XQueryOperatorExpr>(expr);
   return range && range->_type == XQueryOperatorTo ? range : nullptr;
+}
+
+XQueryRangeBounds XQueryOperatorExpr::rangeBounds(XQueryContext& context) const {
+  XQueryCheckStack(context);
+  const Value start = _left ? _left->evaluateWithContext(context) : Value();
+  const Value end = _right->evaluateWithContext(context);
+  XQueryRangeBounds bounds = XQueryRangeBoundsFrom(leftOrEmpty(start), end, context);
+  if (!bounds.areIntegers && isFailure(bounds.answer)) raiseFailure(bounds.answer, _line, context);
+  return bounds;
 }
 
 // Comparing with a range, as in ". = 1 to 1000", asks for its bounds only, where it can.
 Value XQueryOperatorExpr::evaluateWithRange(const Value& left, const XQueryOperatorExpr& range,
                                             XQueryContext& context) const {
-  XQueryCheckStack(context);
-  const Value start = range._left ? range._left->evaluateWithContext(context) : Value();
-  const Value end = range._right->evaluateWithContext(context);
-  const XQueryRangeBounds bounds = XQueryRangeBoundsFrom(range.leftOrEmpty(start), end, context);
-  if (!bounds.areIntegers) {
-    if (isFailure(bounds.answer)) raiseFailure(bounds.answer, range._line, context);
-    return answerFor(left, bounds.answer, context);
-  }
+  const XQueryRangeBounds bounds = range.rangeBounds(context);
+  if (!bounds.areIntegers) return answerFor(left, bounds.answer, context);
   Value answer = XQueryGeneralComparisonWithRange(_type, left, bounds.first, bounds.last);
   return answer ? answer : answerFor(left, XQueryRangeIntegers(bounds, context), context);
 }

@@ -40,6 +40,8 @@ enum XQueryOperatorCode : int {
   XQueryOperatorAfter = 27,
 };
 
+struct XQueryRangeBounds;
+
 class XQueryOperatorExpr : public XQueryExpr {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::OperatorExpr; }
@@ -59,6 +61,12 @@ class XQueryOperatorExpr : public XQueryExpr {
   bool isSign() const {
     return !_left && (_type == XQueryOperatorPlus || _type == XQueryOperatorMinus);
   }
+
+  // The range operator that an expression is, in parentheses or not; null for any other
+  // expression, which may be null.
+  static const XQueryOperatorExpr* rangeIn(const XQueryExpr* expr);
+  // What the operands of a range operator come to; invalid ones are raised.
+  XQueryRangeBounds rangeBounds(XQueryContext& context) const;
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value evaluateWithContext(XQueryContext& context) const override;

@@ -2,7 +2,7 @@
 
 #include "Eval/StackGuard.h"
 #include "Eval/XQueryContextInternal.h"
-#include "Expr/XQuerySequence.h"
+#include "Expr/XQueryClauseItems.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 
@@ -64,15 +64,15 @@ Value XQueryQuantifiedExpr::evaluatePostion(size_t index, XQueryContext& withCon
 Value XQueryQuantifiedExpr::evaluateItems(size_t clause, size_t index,
                                           XQueryContext& context) const {
   const XQueryQuantifiedExprItem& binding = *_items[clause];
-  const Value value = binding.evaluateWithContext(context);
-  const XQueryItemList items(value.get());
+  const XQueryClauseItems items(binding.expr(), false, context);
   const NSNumber* undecided = _every ? NSNumber::trueValue() : NSNumber::falseValue();
   Value answer;
   for (size_t i = 0; i < items.count(); ++i) {
-    if (binding.type() && !XQueryInstanceOf(items[i], *binding.type(), &context)) {
+    Value item = items[i];
+    if (binding.type() && !XQueryInstanceOf(item.get(), *binding.type(), &context)) {
       return XQueryErrors::invalidType.errorAtLine(binding.exprLine());
     }
-    context._internal().setVariable(items[i], binding.varID());
+    context._internal().setVariable(std::move(item), binding.varID());
     answer = evaluatePostion(index + 1, context);
     if (answer.get() != undecided) break;
   }

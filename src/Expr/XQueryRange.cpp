@@ -61,16 +61,22 @@ XQueryRangeBounds XQueryRangeBoundsFrom(const Value& left, const Value& right,
   return bounds;
 }
 
+uint64_t XQueryRangeCount(const XQueryRangeBounds& bounds, XQueryContext& context) {
+  const uint64_t distance =
+      static_cast<uint64_t>(bounds.last) - static_cast<uint64_t>(bounds.first);
+  if (distance >= mostRangeItems()) raiseRangeTooLong(context);
+  return distance + 1;
+}
+
 Value XQueryRangeIntegers(const XQueryRangeBounds& bounds, XQueryContext& context) {
   const uint64_t first = static_cast<uint64_t>(bounds.first);
-  const uint64_t distance = static_cast<uint64_t>(bounds.last) - first;
-  if (distance >= mostRangeItems()) raiseRangeTooLong(context);
+  const uint64_t count = XQueryRangeCount(bounds, context);
   const Ref<XQuerySequence> sequence = XQuerySequence::sequence();
   try {
     std::vector<Value>& items = sequence->objects();
-    items.reserve(distance + 1);
+    items.reserve(count);
     // Counted by distance: the last integer may be the greatest there is.
-    for (uint64_t offset = 0; offset <= distance; ++offset) {
+    for (uint64_t offset = 0; offset < count; ++offset) {
       items.push_back(XQueryNumber::integerWithInt64(static_cast<int64_t>(first + offset)));
     }
   } catch (const std::bad_alloc&) {

@@ -20,6 +20,8 @@ struct XQueryRangeBounds {
 
 XQueryRangeBounds XQueryRangeBoundsFrom(const Value& left, const Value& right,
                                         XQueryContext& context);
+// How many integers bounds that have them enclose. Raises error 0 when they are too many.
+uint64_t XQueryRangeCount(const XQueryRangeBounds& bounds, XQueryContext& context);
 // The integers from bounds that have them. Raises error 0 when they are too many.
 Value XQueryRangeIntegers(const XQueryRangeBounds& bounds, XQueryContext& context);
 

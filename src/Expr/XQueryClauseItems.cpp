@@ -1,0 +1,33 @@
+#include "Expr/XQueryClauseItems.h"
+
+#include "Expr/XQueryBinding.h"
+#include "Expr/XQueryOperatorExpr.h"
+#include "Expr/XQueryRange.h"
+#include "Types/XQueryNumber.h"
+
+namespace xquery {
+
+XQueryClauseItems::XQueryClauseItems(const XQueryExpr* expr, bool flattens, XQueryContext& context)
+    : _list(nullptr) {
+  if (const XQueryOperatorExpr* range = XQueryOperatorExpr::rangeIn(expr)) {
+    const XQueryRangeBounds bounds = range->rangeBounds(context);
+    if (!bounds.areIntegers) return;
+    _count = XQueryRangeCount(bounds, context);
+    _first = bounds.first;
+    _isRange = true;
+    return;
+  }
+  _value = XQueryEvaluateOrEmpty(expr, context);
+  if (flattens) _value = flattened(std::move(_value));
+  _list = XQueryItemList(_value.get());
+  _count = _list.count();
+}
+
+Value XQueryClauseItems::operator[](size_t index) const {
+  if (!_isRange) return _list[index];
+  // Added as unsigned numbers: the last integer may be the greatest there is.
+  return XQueryNumber::integerWithInt64(
+      static_cast<int64_t>(static_cast<uint64_t>(_first) + static_cast<uint64_t>(index)));
+}
+
+}  // namespace xquery

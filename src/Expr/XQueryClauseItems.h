@@ -1,0 +1,35 @@
+// The items that a for clause or a quantified clause walks, one at a time.
+//
+// The integers of a range such as "1 to 1000000" are made when they are asked for: a loop over
+// them then needs no memory but for what it keeps. Nothing can tell the difference, since making an
+// integer has no effect and a range of too many items is refused beforehand all the same.
+#pragma once
+
+#include "Expr/XQuerySequence.h"
+
+#include <cstddef>
+#include <cstdint>
+
+namespace xquery {
+
+class XQueryContext;
+class XQueryExpr;
+
+class XQueryClauseItems {
+ public:
+  // Evaluates the expression, which may be null: no items. `flattens`: arrays inside an array are
+  // walked and NSNull in it is no item; otherwise the elements of an array are the items.
+  XQueryClauseItems(const XQueryExpr* expr, bool flattens, XQueryContext& context);
+
+  size_t count() const { return _count; }
+  Value operator[](size_t index) const;
+
+ private:
+  Value _value;          // of anything but a range
+  XQueryItemList _list;  // over the value
+  bool _isRange = false;
+  int64_t _first = 0;
+  size_t _count = 0;
+};
+
+}  // namespace xquery
