@@ -50,7 +50,8 @@ Outcome start(const std::string& program, const std::vector<std::string>& argume
   const int errFile = openFile(err, O_WRONLY | O_CREAT);
   const pid_t child = fork();
   if (child == 0) {
-    become(std::string(XQUERY_BINARY_DIR "/") + program, arguments, inFile, outFile, errFile);
+    const bool own = program.find('/') == std::string::npos;
+    become(own ? XQUERY_BINARY_DIR "/" + program : program, arguments, inFile, outFile, errFile);
   }
   for (const int file : {inFile, outFile, errFile}) close(file);
 

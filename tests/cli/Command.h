@@ -15,7 +15,8 @@ struct Outcome {
 
 enum class StandardOutput { Captured, ClosedPipe };
 
-// Starts a program of the build directory with `input` as its standard input.
+// Starts a program, of the build directory when its name has no slash, with `input` as its standard
+// input.
 Outcome start(const std::string& program, const std::vector<std::string>& arguments,
               const std::string& input = "",
               StandardOutput standardOutput = StandardOutput::Captured);

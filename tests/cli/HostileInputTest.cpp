@@ -41,6 +41,35 @@ TEST(HostileInput, AZeroInTheQueryIsAnErrorThatIsReportedWhole) {
   EXPECT_THAT(outcome.err, HasSubstr("line:1"));
 }
 
+// --- recursion -----------------------------------------------------------------------------------
+
+// Counts down from `start` to 0.
+std::string recursion(const std::string& start) {
+  return "declare function local:f($n) { if ($n = 0) then 0 else 1 + local:f($n - 1) }; local:f(" +
+         start + ")";
+}
+
+// The command where the limit of the stack cannot be raised.
+Outcome xqueryWithSmallStack(const std::string& query) {
+  return command::start("/bin/sh", {"-c", "ulimit -Hs 8192 && exec \"$0\" -e \"$1\"",
+                                    XQUERY_BINARY_DIR "/xquery", query});
+}
+
+TEST(HostileInput, AFunctionMayCallItselfAHundredThousandTimes) {
+  const std::string query = recursion("100000");
+  EXPECT_EQ(xquery({"-e", query}).out, "100000\n");
+  EXPECT_EQ(xqueryWithSmallStack(query).out, "100000\n");
+}
+
+TEST(HostileInput, EndlessRecursionIsAnError) {
+  const std::string query = recursion("-1");
+  const Outcome outcome = xquery({"-e", query});
+  EXPECT_EQ(outcome.status, 1);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, StartsWith("XQueryError:0"));
+  EXPECT_THAT(outcome.err, HasSubstr("limit: expression nested too deeply"));
+}
+
 TEST(HostileInput, ADocumentAMillionElementsDeepCanBeSearched) {
   const TemporaryDirectory directory;
   const std::string file = directory.write("deep.xml", deepDocument(1000000));
