@@ -61,6 +61,9 @@ TEST(HostileInput, AFunctionMayCallItselfAHundredThousandTimes) {
   EXPECT_EQ(xqueryWithSmallStack(query).out, "100000\n");
 }
 
+// AddressSanitizer gives up on exceptions that leave more than 64 MiB of stack and then reports
+// errors that are none, so there the whole stack is not used up.
+#ifndef __SANITIZE_ADDRESS__
 TEST(HostileInput, EndlessRecursionIsAnError) {
   const std::string query = recursion("-1");
   const Outcome outcome = xquery({"-e", query});
@@ -69,6 +72,7 @@ TEST(HostileInput, EndlessRecursionIsAnError) {
   EXPECT_THAT(outcome.err, StartsWith("XQueryError:0"));
   EXPECT_THAT(outcome.err, HasSubstr("limit: expression nested too deeply"));
 }
+#endif
 
 TEST(HostileInput, ADocumentAMillionElementsDeepCanBeSearched) {
   const TemporaryDirectory directory;
