@@ -87,6 +87,12 @@ void XQueryStep::bindInfoForProlog(XQueryProlog& prolog) {
   }
 }
 
+bool XQueryStep::hasRepeatablePredicates(bool variablesMayChange) const {
+  return std::all_of(_predicates.begin(), _predicates.end(), [=](const auto& predicate) {
+    return !predicate || XQueryIsRepeatable(*predicate, variablesMayChange);
+  });
+}
+
 void XQueryStep::processItems(const Value&, XQueryPathResults&, XQueryContext&, bool) const {}
 
 void XQueryStep::processValue(const Value&, XQueryPathRun&, bool) const {}
@@ -128,13 +134,6 @@ bool XQueryAxisStep::testMayRaise() const {
   if (const auto* nameTest = dyn_cast<XQueryNameTest>(_expr.get())) return nameTest->mayRaise();
   const auto* wildCard = dyn_cast<XQueryWildCardNameTest>(_expr.get());
   return wildCard && wildCard->mayRaise();
-}
-
-bool XQueryAxisStep::isRepeatable() const {
-  if (testMayRaise()) return false;
-  return std::all_of(_predicates.begin(), _predicates.end(), [](const auto& predicate) {
-    return !predicate || XQueryIsRepeatable(*predicate);
-  });
 }
 
 // Whether this is the step that "//" stands for.
@@ -349,15 +348,22 @@ void XQueryPathExpr::bindInfoForProlog(XQueryProlog& prolog) {
 void XQueryPathExpr::findShortcuts() {
   std::vector<XQueryStep*> steps;
   bool nodesMayGo = false;  // some nodes are held by an intermediate result only
+  // A quantified expression, say, in a predicate leaves its variable to the steps after it.
+  bool variablesMayChange = false;
   for (XQueryStep* step = _step.get(); step; step = step->next()) {
-    nodesMayGo = nodesMayGo || (step != _step.get() && !isa<XQueryAxisStep>(step));
     steps.push_back(step);
+    const bool isFilter = !isa<XQueryAxisStep>(step);
+    if (isFilter && step == _step.get()) continue;  // done before the walk begins
+    nodesMayGo = nodesMayGo || isFilter;
+    variablesMayChange = variablesMayChange || isFilter || !step->hasRepeatablePredicates(false);
   }
   _trailCount = 0;
   // From the end, as long as everything from a step on is repeatable.
   for (size_t i = steps.size(); i-- > 0;) {
     auto* step = dyn_cast<XQueryAxisStep>(steps[i]);
-    if (!step || !step->isRepeatable()) break;
+    const bool isRepeatable =
+        step && !step->testMayRaise() && step->hasRepeatablePredicates(variablesMayChange);
+    if (!isRepeatable) break;
     const auto* next = dyn_cast<XQueryAxisStep>(step->next());
     step->_absorbsNext = step->isDescendantShorthand() && next && next->takesPlainChildren();
     const auto* previous = i == 0 ? nullptr : dyn_cast<XQueryAxisStep>(steps[i - 1]);

@@ -61,6 +61,8 @@ class XQueryStep : public NSCounted {
 
   // The same as handlePreicatesFromIndex over a list of nodes, in place.
   void filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex, XQueryContext& context) const;
+  // Whether every predicate may be evaluated again (XQueryIsRepeatable).
+  bool hasRepeatablePredicates(bool variablesMayChange) const;
   // The position that predicate `index` asks for when it is a numeric literal.
   const std::optional<uint64_t>& literalPosition(size_t index) const {
     return _literalPositions[index];
@@ -118,7 +120,6 @@ class XQueryAxisStep : public XQueryStep {
   void filter(NSXMLNode* node, XQueryPathRun& run) const;
   size_t collect(NSXMLNode* node, std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const;
   bool testMayRaise() const;
-  bool isRepeatable() const;
   bool isDescendantShorthand() const;
   bool takesPlainChildren() const;
   bool mayWalkTwice(const XQueryAxisStep* previous) const;

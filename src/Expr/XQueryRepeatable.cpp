@@ -30,10 +30,11 @@ void addElements(const XQueryExprList& list, Waiting& waiting) {
 }
 
 // Adds what the expression consists of; false when its kind is not known to be repeatable.
-bool addParts(const XQueryExpr& expr, Waiting& waiting) {
+bool addParts(const XQueryExpr& expr, bool variablesMayChange, Waiting& waiting) {
   switch (expr.kind()) {
-    case Kind::Literal:
     case Kind::Variable:
+      return !variablesMayChange;
+    case Kind::Literal:
     case Kind::ContextItemExpr:
     case Kind::RootStepExpr:
     case Kind::NameTest:
@@ -57,13 +58,13 @@ bool addParts(const XQueryExpr& expr, Waiting& waiting) {
 
 }  // namespace
 
-bool XQueryIsRepeatable(const XQueryExpr& expr) {
+bool XQueryIsRepeatable(const XQueryExpr& expr, bool variablesMayChange) {
   Waiting waiting = {&expr};
   for (size_t looked = 0; !waiting.empty(); ++looked) {
     if (looked + waiting.size() > mostExpressions) return false;
     const XQueryExpr* next = waiting.back();
     waiting.pop_back();
-    if (next && !addParts(*next, waiting)) return false;
+    if (next && !addParts(*next, variablesMayChange, waiting)) return false;
   }
   return true;
 }

@@ -534,6 +534,24 @@ TEST_F(OverlappingAxes, AreWalkedAgainForAPredicateThatMayHaveEffects) {
   EXPECT_EQ(evaluations, 6);
 }
 
+TEST_F(OverlappingAxes, AreWalkedAgainForAPredicateThatReadsAVariableSetOnTheWay) {
+  const auto nested = parsed("<a><a><b/></a></a>");
+  prolog->newLocalVariableIDForQName(prolog->variableQNameFromString(text("v")));
+  const auto variable = XQueryVariable::variableWithName(text("v"));
+  variable->bindInfoForProlog(*prolog);
+  ASSERT_NE(variable->varID(), 0);
+  // True from the second "a" on only.
+  int visits = 0;
+  const auto setting = probe([&](XQueryContext& c) -> Value {
+    c._internal().setVariable(NSNumber::numberWithBool(++visits == 2), variable->varID());
+    return NSNumber::trueValue();
+  });
+  EXPECT_EQ(found(nested, {rootStep(), anyDepth(), child("a", {setting}),
+                           step(XQueryAxisDescendant, name("b")),
+                           step(XQueryAxisSelf, anyNode(), {variable})}),
+            1U);
+}
+
 TEST_F(OverlappingAxes, OfTreesThatGoAwayAreWalkedAnew) {
   // Every context item yields a tree of its own, and the next may lie where the last one lay.
   int trees = 0;

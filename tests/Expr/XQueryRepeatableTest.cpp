@@ -23,6 +23,13 @@ TEST(Repeatable, LeavesThatHaveNoEffectAre) {
   EXPECT_TRUE(XQueryIsRepeatable(*XQueryContextItem::contextItem()));
 }
 
+TEST(Repeatable, ReadingAVariableThatMayChangeIsNot) {
+  const auto variable = XQueryVariable::variableWithName(text("v"));
+  EXPECT_FALSE(XQueryIsRepeatable(*variable, true));
+  EXPECT_FALSE(XQueryIsRepeatable(*binary(XQueryOperatorPlus, integer("1"), variable), true));
+  EXPECT_TRUE(XQueryIsRepeatable(*integer("1"), true));
+}
+
 TEST(Repeatable, WhatIsNotKnownIsNot) {
   EXPECT_FALSE(XQueryIsRepeatable(*always(text("x"))));
 }
