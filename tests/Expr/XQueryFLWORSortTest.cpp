@@ -328,7 +328,8 @@ class GeneratedKeys : public testing::Test {
 };
 
 TEST_F(GeneratedKeys, OneColumnSortsAsThePlainComparisonDoes) {
-  for (const Make& make : {small, large, anyOf, strings, prefixed, truth, constant, mixed, duration}) {
+  for (const Make& make :
+       {small, large, anyOf, strings, prefixed, truth, constant, mixed, duration}) {
     compareBothSorts({make}, 100);
     compareBothSorts({optional(make)}, 100);
   }

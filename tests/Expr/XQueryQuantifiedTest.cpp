@@ -297,7 +297,8 @@ TEST_F(Quantified, NestingBeyondTheStackIsAnErrorOfTheQuery) {
   Ref<XQueryExpr> expr = always(boolean(true));
   for (int i = 0; i < 300'000; ++i) expr = some({item("x", always(integer(1)))}, expr);
   expr->bindInfoForProlog(*prolog);
-  EXPECT_EQ(prolog->errors().size(), 1U);
+  // Binding may need no stack at all, where its last call is a jump; evaluating always does.
+  EXPECT_LE(prolog->errors().size(), 1U);
   EXPECT_EQ(evaluated(*expr), "error 0 limit: expression nested too deeply");
 }
 
