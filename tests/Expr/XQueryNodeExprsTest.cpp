@@ -166,9 +166,10 @@ TEST_F(NodeExprs, NestingIsBoundedByTheStack) {
                      : Ref<XQueryExpr>(XQueryTextExpr::textExprWithValue(expr));
   }
   expr->bindInfoForProlog(*prolog);
-  ASSERT_FALSE(prolog->errors().empty());
-  EXPECT_EQ(prolog->errors().back()->msg()->utf8(), "limit: expression nested too deeply");
+  // Binding may need no stack at all, where its last call is a jump; evaluating always does.
+  EXPECT_LE(prolog->errors().size(), 1U);
   EXPECT_THROW(expr->evaluateWithContext(*context), NSException);
+  EXPECT_EQ(dynamic.error()->msg()->utf8(), "limit: expression nested too deeply");
 }
 
 }  // namespace
