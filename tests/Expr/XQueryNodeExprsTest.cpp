@@ -169,7 +169,7 @@ TEST_F(NodeExprs, NestingIsBoundedByTheStack) {
   // Binding may need no stack at all, where its last call is a jump; evaluating always does.
   EXPECT_LE(prolog->errors().size(), 1U);
   EXPECT_THROW(expr->evaluateWithContext(*context), NSException);
-  EXPECT_EQ(dynamic.error()->msg()->utf8(), "limit: expression nested too deeply");
+  EXPECT_EQ(context->_internal().error()->msg()->utf8(), "limit: expression nested too deeply");
 }
 
 }  // namespace
