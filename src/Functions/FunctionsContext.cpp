@@ -1,6 +1,7 @@
 #include "Functions/FunctionsContext.h"
 
 #include "Eval/XQueryContextInternal.h"
+#include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
 
 namespace xquery {
@@ -19,6 +20,23 @@ Value fn_position(const Value*, size_t count, XQueryContext& context) {
 
 Value fn_last(const Value*, size_t count, XQueryContext& context) {
   return count == 0 ? countInFocus(context._internal().last()) : Value();
+}
+
+Value fn_static_base_uri(const Value*, size_t count, XQueryContext& context) {
+  if (count != 0) return Value();
+  const Ref<NSString> URI = context._internal().baseURI();
+  if (!URI || URI->length() == 0) return NSNull::null();
+  return XQueryCastAsTypeForContext(URI, XQueryTypeAnyURI, context);
+}
+
+Value fn_default_collation(const Value*, size_t count, XQueryContext& context) {
+  if (count != 0) return Value();
+  const Ref<NSString> URI = context._internal().defaultCollation();
+  return XQueryCastAsTypeForContext(URI ? URI : NSString::empty(), XQueryTypeString, context);
+}
+
+Value fn_implicit_timezone(const Value*, size_t count, XQueryContext&) {
+  return count == 0 ? Value(XQueryNumber::implicitTimeZone()) : Value();
 }
 
 }  // namespace xquery

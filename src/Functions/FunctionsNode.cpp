@@ -6,6 +6,10 @@
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryNumber.h"
+#include "Types/XQueryQName.h"
+#include "Types/XQueryStringFunctions.h"
+
+#include <algorithm>
 
 namespace xquery {
 namespace {
@@ -51,6 +55,37 @@ Value typedMembers(const NSArray& members) {
 bool isNoNumber(NSStringView text) {
   double ignored = 0;
   return !scanDouble(text, ignored) && text != "NaN" && text != "INF" && text != "-INF";
+}
+
+std::string primaryLanguage(const NSString& language) {
+  std::string primary = language.view().substring(0, language.view().find(u'-')).utf8();
+  for (char& unit : primary) {
+    if (unit >= 'A' && unit <= 'Z') unit = static_cast<char>(unit - 'A' + 'a');
+  }
+  return primary;
+}
+
+// What `resolve` finds from the context node for each word of the only argument, in the order of
+// the words.
+template <class Resolve>
+Value nodesForTokens(const Value* arguments, size_t count, Resolve resolve,
+                     XQueryContext& context) {
+  if (count != 1) return Value();
+  const Value item = context._internal().contextItem();
+  const auto* node = dyn_cast<NSXMLNode>(item.get());
+  if (!node) return Value();
+  const Ref<NSString> words =
+      XQueryNormalizeString(cast<NSString>(XQueryPromoteToString(arguments[0], context)));
+  XQueryGatherer found;
+  const uint32_t length = words->length();
+  for (uint32_t start = 0; start <= length;) {
+    const uint32_t end = std::min(words->view().find(u' ', start), length);
+    if (Value each = resolve(node, words->view().substring(start, end - start))) {
+      found.add(std::move(each));
+    }
+    start = end + 1;
+  }
+  return found.value();
 }
 
 }  // namespace
@@ -105,6 +140,53 @@ Value fn_local_name(const Value* arguments, size_t count, XQueryContext& context
   return nameAsString(
       argumentOrContextItem(arguments, count, context),
       [](const NSXMLNode* node) { return node->localName(); }, context);
+}
+
+Value fn_namespace_uri(const Value* arguments, size_t count, XQueryContext& context) {
+  const Value item = argumentOrContextItem(arguments, count, context);
+  Ref<NSString> URI;
+  if (!isNull(item)) {
+    const auto* node = dyn_cast<NSXMLNode>(item.get());
+    if (!node) return Value();
+    URI = node->URI();
+  }
+  return XQueryCastAsTypeForContext(URI ? URI : NSString::empty(), XQueryTypeAnyURI, context);
+}
+
+// Unlike the other names this one is never the context item's.
+Value fn_node_name(const Value* arguments, size_t count, XQueryContext&) {
+  if (count > 1) return Value();
+  const auto* node = count == 1 ? dyn_cast<NSXMLNode>(arguments[0].get()) : nullptr;
+  const bool isNamed = node && (isa<NSXMLElement>(node) || node->kind() == Kind::Attribute);
+  return isNamed ? Value(XQueryQName::qname(node->localName(), node->URI())) : NSNull::null();
+}
+
+// No element is ever nilled, as none is ever validated.
+Value fn_nilled(const Value* arguments, size_t count, XQueryContext&) {
+  if (count != 1) return Value();
+  return isa<NSXMLElement>(arguments[0]) ? Value(NSNumber::falseValue()) : Value(NSNull::null());
+}
+
+// Primary languages are compared alone, so that asking for one variant of a language finds every
+// other one too.
+Value fn_lang(const Value* arguments, size_t count, XQueryContext& context) {
+  if (count < 1 || count > 2) return Value();
+  const Value item = count == 2 ? arguments[1] : context._internal().contextItem();
+  const auto* node = dyn_cast<NSXMLNode>(item.get());
+  if (!node) return NSNumber::falseValue();
+  const Value requested = XQueryPromoteToString(arguments[0], context);
+  const Ref<NSString> language = XQueryNodeLanguage(node);
+  if (!language) return NSNumber::falseValue();
+  return NSNumber::numberWithBool(primaryLanguage(*cast<NSString>(requested.get())) ==
+                                  primaryLanguage(*language));
+}
+
+Value fn_id(const Value* arguments, size_t count, XQueryContext& context) {
+  return nodesForTokens(arguments, count, XQueryNodeResolveID, context);
+}
+
+Value fn_idref(const Value* arguments, size_t count, XQueryContext& context) {
+  return nodesForTokens(arguments, count, XQueryNodeResolveIDRef, context);
 }
 
 // The topmost ancestor, or the node itself.

@@ -6,8 +6,10 @@
 #include "Functions/FunctionsContext.h"
 #include "Functions/FunctionsError.h"
 #include "Functions/FunctionsNode.h"
+#include "Functions/FunctionsQName.h"
 #include "Functions/FunctionsSequence.h"
 #include "Functions/FunctionsString.h"
+#include "Functions/FunctionsURI.h"
 
 #include <array>
 #include <new>
@@ -23,13 +25,13 @@ constexpr auto EXT = XQueryNamespaceExt;
 
 // A row without a procedure is a name that the engine knows and has no answer for.
 constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
-    {FN, "node-name", nullptr},
-    {FN, "nilled", nullptr},
+    {FN, "node-name", fn_node_name},
+    {FN, "nilled", fn_nilled},
     {FN, "string", fn_string},
     {FN, "data", fn_data},
-    {FN, "base-uri", nullptr},
-    {FN, "static-base-uri", nullptr},
-    {FN, "document-uri", nullptr},
+    {FN, "base-uri", fn_base_uri},
+    {FN, "static-base-uri", fn_static_base_uri},
+    {FN, "document-uri", fn_document_uri},
     {FN, "error", fn_error},
     {FN, "trace", fn_trace},
     {FN, "codepoints-to-string", nullptr},
@@ -61,18 +63,18 @@ constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
     {FN, "ceiling", nullptr},
     {FN, "round", nullptr},
     {FN, "round-half-to-even", nullptr},
-    {FN, "resolve-QName", nullptr},
-    {FN, "QName", nullptr},
-    {FN, "local-name-from-QName", nullptr},
-    {FN, "namespace-uri-from-QName", nullptr},
-    {FN, "namespace-uri-for-prefix", nullptr},
-    {FN, "in-scope-prefixes", nullptr},
-    {FN, "resolve-uri", nullptr},
+    {FN, "resolve-QName", fn_resolve_QName},
+    {FN, "QName", fn_QName},
+    {FN, "local-name-from-QName", fn_local_name_from_QName},
+    {FN, "namespace-uri-from-QName", fn_namespace_uri_from_QName},
+    {FN, "namespace-uri-for-prefix", fn_namespace_uri_for_prefix},
+    {FN, "in-scope-prefixes", fn_in_scope_prefixes},
+    {FN, "resolve-uri", fn_resolve_uri},
     {FN, "name", fn_name},
     {FN, "local-name", fn_local_name},
-    {FN, "namespace-uri", nullptr},
+    {FN, "namespace-uri", fn_namespace_uri},
     {FN, "number", fn_number},
-    {FN, "lang", nullptr},
+    {FN, "lang", fn_lang},
     {FN, "root", fn_root},
     {FN, "zero-or-one", fn_zero_or_one},
     {FN, "one-or-more", fn_one_or_more},
@@ -93,9 +95,9 @@ constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
     {FN, "max", nullptr},
     {FN, "min", nullptr},
     {FN, "sum", fn_sum},
-    {FN, "id", nullptr},
-    {FN, "idref", nullptr},
-    {FN, "doc", nullptr},
+    {FN, "id", fn_id},
+    {FN, "idref", fn_idref},
+    {FN, "doc", fn_doc},
     {FN, "collection", nullptr},
     {FN, "position", fn_position},
     {FN, "last", fn_last},
@@ -130,8 +132,8 @@ constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
     {FN, "current-dateTime", nullptr},
     {FN, "current-time", nullptr},
     {FN, "dateTime", nullptr},
-    {FN, "implicit-timezone", nullptr},
-    {FN, "default-collation", nullptr},
+    {FN, "implicit-timezone", fn_implicit_timezone},
+    {FN, "default-collation", fn_default_collation},
     {XS, "string", xs_string},
     {XS, "boolean", xs_boolean},
     {XS, "decimal", xs_decimal},

@@ -5,12 +5,15 @@
 //   -- namespace p=urn:p            (optional, repeatable: a context namespace)
 //   -- xml                          (optional: the context document, to the next section)
 //   <a><b/></a>
+//   -- file NAME                    (optional, repeatable: a file to load; "@folder@" stands in the
+//   <c/>                             query and its result for the URL of its folder)
 //   -- query
 //   //b
 //   -- result                       (one line per item: type, tab, text as the command prints it)
 //   element()	<b/>
 //   -- error 6 line 1 invalid type for operator     (instead of a result; "line N" is optional,
 //                                                    "..." stands for any text)
+#include "Platform/LoadingTestSupport.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>
@@ -34,6 +37,7 @@ struct Case {
   XQueryConstants constants;
   std::map<std::string, std::string> namespaces;
   std::string xml;
+  std::map<std::string, std::string> files;
   std::string query;
   std::vector<std::string> result;
   std::string error;  // empty when a result is expected
@@ -47,8 +51,9 @@ std::string takeUpTo(std::string& text, char separator) {
   return head;
 }
 
-void readHeader(Case& c, std::string header, std::string& section) {
+void readHeader(Case& c, std::string header, std::string& section, std::string& fileName) {
   section = takeUpTo(header, ' ');
+  fileName = header;
   if (section == "var") {
     const std::string name = takeUpTo(header, '=');
     c.constants[name] = XQueryUntypedAtomic(header);
@@ -63,7 +68,7 @@ void readHeader(Case& c, std::string header, std::string& section) {
 std::vector<Case> readCases(const std::filesystem::path& path) {
   std::ifstream in(path);
   std::vector<Case> cases;
-  std::string line, section;
+  std::string line, section, fileName;
   for (int number = 1; std::getline(in, line); ++number) {
     if (line.rfind("== ", 0) == 0) {
       cases.emplace_back();
@@ -72,9 +77,11 @@ std::vector<Case> readCases(const std::filesystem::path& path) {
       cases.back().line = number;
       section.clear();
     } else if (line.rfind("-- ", 0) == 0) {
-      readHeader(cases.back(), line.substr(3), section);
+      readHeader(cases.back(), line.substr(3), section, fileName);
     } else if (section == "xml") {
       cases.back().xml += line + "\n";
+    } else if (section == "file") {
+      cases.back().files[fileName] += line + "\n";
     } else if (section == "query") {
       cases.back().query += line + "\n";
     } else if (section == "result" && !line.empty()) {
@@ -82,6 +89,13 @@ std::vector<Case> readCases(const std::filesystem::path& path) {
     }
   }
   return cases;
+}
+
+std::string replaced(std::string text, std::string_view from, std::string_view by) {
+  for (size_t at = 0; (at = text.find(from, at)) != text.npos; at += by.size()) {
+    text.replace(at, from.size(), by);
+  }
+  return text;
 }
 
 std::string printed(const NSObject& item) {
@@ -123,6 +137,11 @@ class QueryCase : public testing::Test {
   explicit QueryCase(Case c) : _case(std::move(c)) {}
 
   void TestBody() override {
+    const TestFolder folder;
+    for (const auto& [name, text] : _case.files) folder.write(name, text);
+    constexpr std::string_view place = "@folder@";
+    const std::string URL = folder.URL("");
+    const std::string text = replaced(_case.query, place, URL);
     Value document;
     if (!_case.xml.empty()) {
       NSXMLParseError failure;
@@ -131,14 +150,14 @@ class QueryCase : public testing::Test {
     }
     // The last line break belongs to the file, not to the query.
     const auto query = XQuery::xqueryWithSource(
-        std::string_view(_case.query).substr(0, _case.query.empty() ? 0 : _case.query.size() - 1));
+        std::string_view(text).substr(0, text.empty() ? 0 : text.size() - 1));
     const auto context = XQueryContext::xqueryContextWithNamespaces(_case.namespaces);
     Ref<XQueryError> error;
     const auto items = context->evaluateXQuery(*query, _case.constants, document, &error);
     if (!_case.error.empty()) {
       ASSERT_TRUE(error) << _case.file << ":" << _case.line << " expected an error";
       const bool withLine = _case.error.find(" line ") != std::string::npos;
-      const std::string found = printedError(*error, withLine);
+      const std::string found = replaced(printedError(*error, withLine), URL, place);
       EXPECT_TRUE(matches(found, _case.error)) << _case.file << ":" << _case.line << "\n  found    "
                                                << found << "\n  expected " << _case.error;
       return;
@@ -146,7 +165,8 @@ class QueryCase : public testing::Test {
     ASSERT_FALSE(error) << _case.file << ":" << _case.line << " " << error->description()->utf8();
     std::vector<std::string> lines;
     if (items) {
-      for (const Value& item : items->objects()) lines.push_back(printed(*item));
+      for (const Value& item : items->objects())
+        lines.push_back(replaced(printed(*item), URL, place));
     }
     EXPECT_EQ(lines, _case.result) << _case.file << ":" << _case.line;
   }

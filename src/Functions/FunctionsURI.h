@@ -1,0 +1,23 @@
+// Functions about URIs and the documents that they name.
+#pragma once
+
+#include "xquery/Object.h"
+#include "xquery/String.h"
+#include "xquery/URL.h"
+
+#include <cstddef>
+
+namespace xquery {
+
+class XQueryContext;
+
+Value fn_base_uri(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_document_uri(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_doc(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_resolve_uri(const Value* arguments, size_t count, XQueryContext& context);
+
+// The reference resolved against the static base URI; by itself where there is none that anything
+// can be resolved against. Null for a text that is no URI reference.
+Ref<NSURL> XQueryURLInContext(const Ref<NSString>& reference, XQueryContext& context);
+
+}  // namespace xquery
