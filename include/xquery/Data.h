@@ -25,7 +25,8 @@ class XQUERY_EXPORT NSData : public NSCounted {
   bool isEqualToData(const NSData& other) const { return _bytes == other._bytes; }
 
  protected:
-  explicit NSData(std::string bytes) : NSCounted(Kind::Data), _bytes(std::move(bytes)) {}
+  explicit NSData(std::string bytes);
+  ~NSData() override;
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 

@@ -20,6 +20,8 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <memory>
+#include <new>
 #include <sys/single_threaded.h>
 #include <type_traits>
 #include <utility>
@@ -312,4 +314,39 @@ T* dyn_cast(const Ref<NSObject>& value) {
 
 using Value = Ref<NSObject>;
 
+// Memory that counts toward the memory ceiling of the evaluation on this thread. `bytes` is the
+// same for both; throws std::bad_alloc.
+[[nodiscard]] XQUERY_EXPORT void* allocateValueMemory(size_t bytes);
+XQUERY_EXPORT void freeValueMemory(void* block, size_t bytes) noexcept;
+
+template <class T>
+struct ValueAllocator {
+  using value_type = T;
+
+  ValueAllocator() = default;
+  template <class U>
+  ValueAllocator(const ValueAllocator<U>&) noexcept {}
+
+  [[nodiscard]] T* allocate(size_t count) {
+    if (count > SIZE_MAX / 2 / sizeof(T)) throw std::bad_array_new_length();
+    return static_cast<T*>(allocateValueMemory(count * sizeof(T)));
+  }
+  void deallocate(T* block, size_t count) noexcept { freeValueMemory(block, count * sizeof(T)); }
+
+  friend bool operator==(const ValueAllocator&, const ValueAllocator&) { return true; }
+};
+
 }  // namespace xquery
+
+// A sequence is a std::vector of values: its growth counts as well, wherever it is held.
+template <>
+class std::allocator<xquery::Value> : public xquery::ValueAllocator<xquery::Value> {
+ public:
+  using size_type = size_t;
+  using difference_type = ptrdiff_t;
+  using propagate_on_container_move_assignment = std::true_type;
+
+  allocator() = default;
+  template <class U>
+  allocator(const allocator<U>&) noexcept {}
+};

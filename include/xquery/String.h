@@ -146,8 +146,11 @@ class XQUERY_EXPORT NSMutableString {
  private:
   void widen();
 
-  std::string _ascii;
-  std::u16string _wide;
+  template <class Unit>
+  using Units = std::basic_string<Unit, std::char_traits<Unit>, ValueAllocator<Unit>>;
+
+  Units<char> _ascii;
+  Units<char16_t> _wide;
   bool _isWide = false;
 };
 

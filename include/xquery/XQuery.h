@@ -9,6 +9,7 @@
 
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
+#include "xquery/Limits.h"
 #include "xquery/Loading.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
@@ -121,8 +122,9 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   // Null on error and when there is no value at all (an empty query, a library module, "." without
   // a context item). `*error`, when `error` is not null, is set to null first and on failure to the
   // error: the first one of a query that failed to compile, 16 "unresloved external variable -
-  // name" or "unresloved external function - name", 0 and a text that begins with "limit: " when
-  // the engine ran out of stack, memory or digits, or what an expression raised.
+  // name" or "unresloved external function - name", 0 and a text that begins with "limit: " when a
+  // limit of the context was reached or the engine ran out of stack, memory or digits, or what an
+  // expression raised.
   //
   // A null or NSNull context item leaves the context item of an earlier evaluation in force.
   [[nodiscard]] Ref<NSArray> evaluateXQuery(const XQuery& query, const XQueryConstants& constants,
@@ -138,6 +140,10 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   // had stays missing, whatever the settings are later.
   void contextSetLoading(const XQueryLoading& loading);
   const XQueryLoading& contextLoading() const;
+  // What each of the following evaluations may take; one that is under way keeps what was set when
+  // it began.
+  void contextSetLimits(XQueryLimits limits);
+  const XQueryLimits& contextLimits() const;
 
   // Accepts its arguments and does nothing.
   void contextAddClientSelector(std::string_view selector, std::string_view forName);
@@ -153,6 +159,7 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  Value evaluateModule(const XQueryInternal& compiled, const XQueryConstants& constants);
   Ref<NSArray> shapedResult(const Value& result, Ref<XQueryError>* error);
   std::unique_ptr<XQueryContextInternal> _private;
 };

@@ -31,17 +31,17 @@ uintptr_t lowestUsableAddress() {
   return reinterpret_cast<uintptr_t>(base) + (size / 2 < reserve ? size / 2 : reserve);
 }
 
-thread_local uintptr_t stackLimit = 0;
-
 }  // namespace
 
 bool XQueryStackHasRoom() {
-  if (stackLimit == 0) stackLimit = lowestUsableAddress();
-  return reinterpret_cast<uintptr_t>(__builtin_frame_address(0)) > stackLimit;
+  WorkMeter& meter = workMeter;
+  if (meter.stackLimit == UINTPTR_MAX) meter.stackLimit = lowestUsableAddress();
+  return reinterpret_cast<uintptr_t>(__builtin_frame_address(0)) > meter.stackLimit;
 }
 
-void XQueryCheckStack(XQueryContext& context) {
+void XQueryCheckStackClosely(XQueryContext& context) {
   if (!XQueryStackHasRoom()) context._internal().raise(XQueryErrors::nestedTooDeeply.error());
+  if (workMeter.stepsLeft <= 0) lookAtWork();
 }
 
 bool XQueryCheckStack(XQueryProlog& prolog) {

@@ -1,6 +1,9 @@
-// The bound on nesting: the stack space that is really left on the calling thread. Evaluation and
-// binding recurse with the nesting of the query, which has no other limit.
+// The bounds on evaluation: nesting, by the stack space that is really left on the calling thread,
+// and the limits that the host set. Evaluation and binding recurse with the nesting of the query,
+// which has no other limit.
 #pragma once
+
+#include "Platform/WorkMeter.h"
 
 #include <cstdint>
 
@@ -9,12 +12,23 @@ namespace xquery {
 class XQueryContext;
 class XQueryProlog;
 
-// Whether enough stack is left to go one level deeper: one comparison of an address.
+// Whether enough stack is left to go one level deeper.
 bool XQueryStackHasRoom();
 
-// Raises error 0 "limit: expression nested too deeply" when there is none.
-void XQueryCheckStack(XQueryContext& context);
-// The same while binding: adds the error to the prolog (once) and answers false.
+// What XQueryCheckStack does when its two comparisons do not settle the matter.
+void XQueryCheckStackClosely(XQueryContext& context);
+
+// For every call and every nested expression, once per evaluation of it: raises error 0 "limit:
+// expression nested too deeply" when too little stack is left, and counts a step of work, which
+// raises the error of the context's limit that is reached. A loop inside an expression whose turns
+// evaluate nothing has a WorkPacer besides.
+[[gnu::always_inline]] inline void XQueryCheckStack(XQueryContext& context) {
+  const auto frame = reinterpret_cast<uintptr_t>(__builtin_frame_address(0));
+  if (frame <= workMeter.stackLimit || --workMeter.stepsLeft <= 0) [[unlikely]] {
+    XQueryCheckStackClosely(context);
+  }
+}
+// Nesting alone, while binding: adds the error to the prolog (once) and answers false.
 bool XQueryCheckStack(XQueryProlog& prolog);
 
 }  // namespace xquery

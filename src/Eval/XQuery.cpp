@@ -1,6 +1,7 @@
 // The exported classes: thin shells over their private objects, and the evaluation driver.
 #include "xquery/XQuery.h"
 
+#include "Eval/LimitWatch.h"
 #include "Eval/XQueryContextInternal.h"
 #include "Eval/XQueryGlobals.h"
 #include "Eval/XQueryInternal.h"
@@ -86,6 +87,14 @@ const XQueryLoading& XQueryContext::contextLoading() const {
   return _private->loader().loading();
 }
 
+void XQueryContext::contextSetLimits(XQueryLimits limits) {
+  _private->setLimits(std::move(limits));
+}
+
+const XQueryLimits& XQueryContext::contextLimits() const {
+  return _private->limits();
+}
+
 void XQueryContext::contextAddClientSelector(std::string_view, std::string_view) {}
 
 void XQueryContext::_traceValue(const Value& value, const Ref<NSString>& forLabel) {
@@ -127,21 +136,29 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   XQueryProlog& prolog = *compiled.prolog();
   context.setOrdered(prolog.ordered());
   context.setActiveProlog(&prolog);
-  Value result;
-  try {
-    XQuerySetConstants(constants, prolog, *this);
-    XQueryEvaluateDeclarations(prolog, *this);
-    if (compiled.body()) result = compiled.body()->evaluateWithContext(*this);
-  } catch (const NSException&) {
-    result = context.error();
-  } catch (const std::bad_alloc&) {
-    result = XQueryErrors::outOfMemory.error();
-  } catch (const std::length_error&) {
-    // Only decimals throw it.
-    result = XQueryErrors::tooManyDigits.error();
-  }
+  const Value result = evaluateModule(compiled, constants);
   context._clearGlobals();
   return shapedResult(result, error);
+}
+
+// The value of the body, or the error that ended the evaluation.
+Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
+                                    const XQueryConstants& constants) {
+  XQueryLimitWatch watch(*this);
+  try {
+    // A limit that is reached already ends the shortest evaluation as well.
+    watch.lookAtWork();
+    XQuerySetConstants(constants, *compiled.prolog(), *this);
+    XQueryEvaluateDeclarations(*compiled.prolog(), *this);
+    return compiled.body() ? compiled.body()->evaluateWithContext(*this) : Value();
+  } catch (const NSException&) {
+    return _private->error();
+  } catch (const std::bad_alloc&) {
+    return watch.allocationFailure().error();
+  } catch (const std::length_error&) {
+    // Only decimals throw it.
+    return XQueryErrors::tooManyDigits.error();
+  }
 }
 
 Ref<NSArray> XQueryContext::shapedResult(const Value& result, Ref<XQueryError>* error) {

@@ -117,6 +117,9 @@ class XQueryContextInternal {
   std::shared_ptr<XQueryClient> client() const { return _client; }
   void setClient(std::shared_ptr<XQueryClient> client) { _client = std::move(client); }
 
+  const XQueryLimits& limits() const { return _limits; }
+  void setLimits(XQueryLimits limits) { _limits = std::move(limits); }
+
   // Always null: external functions cannot be bound.
   Value XQueryExternalFunctionForQName(const XQueryQName& qName) const;
 
@@ -137,6 +140,7 @@ class XQueryContextInternal {
   Ref<XQueryDate> _currentDateTime;
   XQueryProlog* _prolog = nullptr;
   std::shared_ptr<XQueryClient> _client;
+  XQueryLimits _limits;
   Value _contextItem;
   int64_t _position = 0;
   int64_t _last = 0;

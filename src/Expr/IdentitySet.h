@@ -1,6 +1,7 @@
 // A set of objects by identity: open addressing over pointers, nothing retained.
 #pragma once
 
+#include "Platform/WorkMeter.h"
 #include "xquery/Object.h"
 
 #include <cstdint>
@@ -40,7 +41,9 @@ class XQueryIdentitySet {
   void grow() {
     std::vector<const NSObject*> old(_slots.empty() ? smallestSize : 2 * _slots.size());
     old.swap(_slots);
+    WorkPacer pacer;
     for (const NSObject* object : old) {
+      pacer.turn();
       if (object) _slots[indexFor(object)] = object;
     }
   }

@@ -15,6 +15,7 @@
 #include "Expr/NodeOrder.h"
 
 #include "Expr/StableMergeSort.h"
+#include "Platform/WorkMeter.h"
 #include "xquery/Number.h"
 
 #include <algorithm>
@@ -74,7 +75,9 @@ const NSXMLNode* nodeOf(const Value& value) {
 
 // Being comparable is transitive, so neighbours decide for all.
 bool allComparable(const std::vector<Value>& nodes) {
+  WorkPacer pacer;
   for (size_t i = 1; i < nodes.size(); ++i) {
+    pacer.turn();
     if (!NSXMLNode::haveComparableOrder(nodeOf(nodes[i - 1]), nodeOf(nodes[i]))) return false;
   }
   return true;
@@ -94,7 +97,9 @@ std::vector<Placed> placedNodes(std::vector<Value>& nodes) {
   std::vector<Placed> placed;
   placed.reserve(nodes.size());
   const NSXMLNode* previous = nullptr;
+  WorkPacer pacer;
   for (Value& value : nodes) {
+    pacer.turn();
     const NSXMLNode* node = nodeOf(value);
     const bool inSameTree = previous && NSXMLNode::haveComparableOrder(previous, node);
     const NSXMLNode* root = inSameTree ? placed.back().root : node->rootNode();
@@ -123,8 +128,11 @@ void sortByOrderNumber(std::vector<Value>& nodes) {
     const uint32_t number = nodeOf(node)->orderNumber();
     numbered.push_back({number, std::move(node)});
   }
-  std::sort(numbered.begin(), numbered.end(),
-            [](const Numbered& a, const Numbered& b) { return a.number < b.number; });
+  WorkPacer pacer;
+  std::sort(numbered.begin(), numbered.end(), [&pacer](const Numbered& a, const Numbered& b) {
+    pacer.turn();
+    return a.number < b.number;
+  });
   for (size_t i = 0; i < nodes.size(); ++i) nodes[i] = std::move(numbered[i].node);
 }
 

@@ -3,6 +3,8 @@
 // array is ever touched. The standard library promises that only for consistent relations.
 #pragma once
 
+#include "Platform/WorkMeter.h"
+
 #include <algorithm>
 #include <utility>
 #include <vector>
@@ -14,12 +16,14 @@ namespace xquery {
 template <class T, class Before>
 void stableMergeSort(std::vector<T>& items, Before before) {
   std::vector<T> merged(items.size());
+  WorkPacer pacer;
   for (size_t width = 1; width < items.size(); width *= 2) {
     for (size_t start = 0; start < items.size(); start += 2 * width) {
       const size_t middle = std::min(start + width, items.size());
       const size_t end = std::min(start + 2 * width, items.size());
       size_t left = start, right = middle;
       for (size_t out = start; out < end; ++out) {
+        pacer.turn();
         const bool takeRight = left == middle || (right < end && before(items[right], items[left]));
         merged[out] = std::move(items[takeRight ? right++ : left++]);
       }

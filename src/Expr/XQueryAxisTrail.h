@@ -120,7 +120,9 @@ class XQueryAxisTrail {
   template <class Visit>
   void walkFollowing(NSXMLNode* node, Visit& visit) {
     const NSXMLNode* earlier = contextUpTo(node);
+    WorkPacer pacer;
     for (NSXMLNode* at = node; at && isAfter(at, earlier); at = at->parent()) {
+      pacer.turn();
       if (NSXMLNode* sibling = at->nextSibling()) return walkInterval(sibling, nullptr, visit);
     }
   }
@@ -129,7 +131,11 @@ class XQueryAxisTrail {
   void walkAncestors(NSXMLNode* node, bool andSelf, Visit& visit) {
     const NSXMLNode* earlier = contextUpTo(node);
     NSXMLNode* at = andSelf ? node : node->parent();
-    for (; at && isAfter(at, earlier); at = at->parent()) visit(at);
+    WorkPacer pacer;
+    for (; at && isAfter(at, earlier); at = at->parent()) {
+      pacer.turn();
+      visit(at);
+    }
     // Its own walk did not visit the earlier item.
     if (at && at == earlier && !andSelf) visit(at);
   }
@@ -161,10 +167,11 @@ class XQueryAxisTrail {
     NSXMLNode* const walked = context;
     if (walked && !isBefore(node, walked)) return;
     context = node;
-    for (NSXMLNode* next = node->nextSibling(); next; next = next->nextSibling()) {
+    auto visitUpToWalked = [&](NSXMLNode* next) {
       visit(next);
-      if (next == walked) return;
-    }
+      return next != walked;
+    };
+    XQueryWalkSiblings(node->nextSibling(), visitUpToWalked);
   }
 
   template <class Visit>
@@ -174,11 +181,11 @@ class XQueryAxisTrail {
     NSXMLNode* const walked = context;
     if (walked && !isBefore(walked, node)) return;
     context = node;
-    for (NSXMLNode* previous = node->previousSibling(); previous;
-         previous = previous->previousSibling()) {
+    auto visitUpToWalked = [&](NSXMLNode* previous) {
       visit(previous);
-      if (previous == walked) return;
-    }
+      return previous != walked;
+    };
+    XQueryWalkPrecedingSiblings(node, visitUpToWalked);
   }
 
   // What precedes the earlier item precedes the later one as well, and so do the ancestors of the
@@ -193,12 +200,19 @@ class XQueryAxisTrail {
     if (!earlier) return XQueryWalkPreceding(node, visit);
     std::vector<NSXMLNode*> above;
     NSXMLNode* common = node->parent();
-    for (; isAfter(common, earlier); common = common->parent()) above.push_back(common);
+    WorkPacer pacer;
+    for (; isAfter(common, earlier); common = common->parent()) {
+      pacer.turn();
+      above.push_back(common);
+    }
     if (common == earlier) {
       above.push_back(common);
     } else {
       std::vector<NSXMLNode*> left;
-      for (NSXMLNode* at = earlier->parent(); at != common; at = at->parent()) left.push_back(at);
+      for (NSXMLNode* at = earlier->parent(); at != common; at = at->parent()) {
+        pacer.turn();
+        left.push_back(at);
+      }
       for (; !left.empty(); left.pop_back()) visit(left.back());
     }
     XQueryWalkNodesExcept(latest, node, std::move(above), visit);

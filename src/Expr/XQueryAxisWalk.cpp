@@ -9,7 +9,9 @@ NSXMLNode* XQueryDescendantStop(const NSXMLNode* node) {
 }
 
 NSXMLNode* XQueryFollowingStart(const NSXMLNode* node) {
+  WorkPacer pacer;
   for (; node; node = node->parent()) {
+    pacer.turn();
     if (NSXMLNode* sibling = node->nextSibling()) return sibling;
   }
   return nullptr;
@@ -17,12 +19,20 @@ NSXMLNode* XQueryFollowingStart(const NSXMLNode* node) {
 
 std::vector<NSXMLNode*> XQueryAncestors(const NSXMLNode* node) {
   std::vector<NSXMLNode*> ancestors;
-  for (NSXMLNode* at = node->parent(); at; at = at->parent()) ancestors.push_back(at);
+  WorkPacer pacer;
+  for (NSXMLNode* at = node->parent(); at; at = at->parent()) {
+    pacer.turn();
+    ancestors.push_back(at);
+  }
   return ancestors;
 }
 
 NSXMLNode* XQueryLastInSubtree(NSXMLNode* node) {
-  while (NSXMLNode* child = node->lastChild()) node = child;
+  WorkPacer pacer;
+  while (NSXMLNode* child = node->lastChild()) {
+    pacer.turn();
+    node = child;
+  }
   return node;
 }
 

@@ -4,10 +4,12 @@
 // document order for the forward axes and for preceding, nearest first for the other reverse axes.
 // XQueryWalkAlongAxis visits the same nodes in the order in which predicates count them, nearest
 // first for preceding too. The visitor answers whether the walk goes on. Nothing is allocated,
-// except that the preceding axis in document order keeps the list of the node's ancestors.
+// except that the preceding axis in document order keeps the list of the node's ancestors. A walk
+// may be ended at a limit of the evaluation, by an exception.
 #pragma once
 
 #include "Expr/XQueryPath.h"
+#include "Platform/WorkMeter.h"
 #include "xquery/XMLNode.h"
 
 #include <vector>
@@ -31,7 +33,9 @@ NSXMLNode* XQueryLastInSubtree(NSXMLNode* node);
 // Visits `first` and each node after it in document order, up to (excluding) `stop`.
 template <class Visit>
 void XQueryWalkNodes(NSXMLNode* first, const NSXMLNode* stop, Visit& visit) {
+  WorkPacer pacer;
   for (NSXMLNode* node = first; node && node != stop; node = node->nextNode()) {
+    pacer.turn();
     if (!visit(node)) return;
   }
 }
@@ -64,10 +68,14 @@ void XQueryWalkPreceding(NSXMLNode* node, Visit& visit) {
 // What precedes a node are the subtrees of the siblings before it and before its ancestors.
 template <class Visit>
 void XQueryWalkPrecedingNearestFirst(NSXMLNode* node, Visit& visit) {
+  WorkPacer pacer;
   for (const NSXMLNode* above = node; above; above = above->parent()) {
+    pacer.turn();
     for (NSXMLNode* top = above->previousSibling(); top; top = top->previousSibling()) {
       NSXMLNode* at = XQueryLastInSubtree(top);
+      pacer.turn();
       while (at != top) {
+        pacer.turn();
         if (!visit(at)) return;
         NSXMLNode* previous = at->previousSibling();
         at = previous ? XQueryLastInSubtree(previous) : at->parent();
@@ -79,7 +87,9 @@ void XQueryWalkPrecedingNearestFirst(NSXMLNode* node, Visit& visit) {
 
 template <class Visit>
 void XQueryWalkAncestors(NSXMLNode* first, Visit& visit) {
+  WorkPacer pacer;
   for (NSXMLNode* node = first; node; node = node->parent()) {
+    pacer.turn();
     if (!visit(node)) return;
   }
 }
@@ -88,9 +98,31 @@ template <class Visit>
 void XQueryWalkAttributes(NSXMLNode* node, Visit& visit) {
   const auto* element = dyn_cast<NSXMLElement>(node);
   if (!element) return;
+  WorkPacer pacer;
   for (NSXMLNode* attribute = element->firstAttribute(); attribute;
        attribute = NSXMLElement::nextAttribute(attribute)) {
+    pacer.turn();
     if (!visit(attribute)) return;
+  }
+}
+
+// Visits `first` and its following siblings.
+template <class Visit>
+void XQueryWalkSiblings(NSXMLNode* first, Visit& visit) {
+  WorkPacer pacer;
+  for (NSXMLNode* node = first; node; node = node->nextSibling()) {
+    pacer.turn();
+    if (!visit(node)) return;
+  }
+}
+
+template <class Visit>
+void XQueryWalkPrecedingSiblings(NSXMLNode* node, Visit& visit) {
+  WorkPacer pacer;
+  for (NSXMLNode* previous = node->previousSibling(); previous;
+       previous = previous->previousSibling()) {
+    pacer.turn();
+    if (!visit(previous)) return;
   }
 }
 
@@ -98,10 +130,7 @@ template <class Visit>
 void XQueryWalkAxis(NSXMLNode* node, int axis, Visit visit) {
   switch (axis) {
     case XQueryAxisChild:
-      for (NSXMLNode* child = node->firstChild(); child; child = child->nextSibling()) {
-        if (!visit(child)) return;
-      }
-      return;
+      return XQueryWalkSiblings(node->firstChild(), visit);
     case XQueryAxisDescendant:
       return XQueryWalkNodes(node->nextNode(), XQueryDescendantStop(node), visit);
     case XQueryAxisDescendantOrSelf:
@@ -113,10 +142,7 @@ void XQueryWalkAxis(NSXMLNode* node, int axis, Visit visit) {
       visit(node);
       return;
     case XQueryAxisFollowingSibling:
-      for (NSXMLNode* next = node->nextSibling(); next; next = next->nextSibling()) {
-        if (!visit(next)) return;
-      }
-      return;
+      return XQueryWalkSiblings(node->nextSibling(), visit);
     case XQueryAxisFollowing:
       return XQueryWalkNodes(XQueryFollowingStart(node), nullptr, visit);
     case XQueryAxisAncestor:
@@ -127,11 +153,7 @@ void XQueryWalkAxis(NSXMLNode* node, int axis, Visit visit) {
     case XQueryAxisPreceding:
       return XQueryWalkPreceding(node, visit);
     case XQueryAxisPrecedingSibling:
-      for (NSXMLNode* previous = node->previousSibling(); previous;
-           previous = previous->previousSibling()) {
-        if (!visit(previous)) return;
-      }
-      return;
+      return XQueryWalkPrecedingSiblings(node, visit);
     case XQueryAxisAncestorOrSelf:
       return XQueryWalkAncestors(node, visit);
     default:  // no such axis: nothing is walked

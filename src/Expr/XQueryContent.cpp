@@ -5,6 +5,7 @@
 #include "Expr/XQueryContentText.h"
 #include "Expr/XQueryElementContentString.h"
 #include "Expr/XQueryInScopeNamespaces.h"
+#include "Platform/WorkMeter.h"
 #include "Platform/XMLTree.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryAtomization.h"
@@ -22,7 +23,10 @@ void XQueryContent::add(const Value& value) {
 
 void XQueryContent::addItems(const std::vector<Value>& items) {
   XQueryCheckStack(_context);
-  for (const Value& item : items) addItem(item.get());
+  for (const Value& item : items) {
+    checkWork();
+    addItem(item.get());
+  }
 }
 
 void XQueryContent::addItem(NSObject* item) {

@@ -4,6 +4,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryClauseItems.h"
 #include "Expr/XQueryFLWORSort.h"
+#include "Platform/WorkMeter.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
@@ -135,6 +136,7 @@ void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
   const XQueryClauseItems items(clause.expr(), true, withContext);
   const bool isLast = index + 1 == _forLet.size();
   for (size_t k = 0; k < items.count(); ++k) {
+    checkWork();
     Value item = items[k];
     checkType(clause, item.get(), withContext);
     dynamic.setVariable(std::move(item), clause.varID());

@@ -21,6 +21,7 @@
 #include "Expr/XQueryFLWORSort.h"
 
 #include "Expr/StableMergeSort.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Number.h"
 #include "xquery/String.h"
@@ -157,7 +158,9 @@ Family familyOf(const NSObject& key) {
 // What all keys of a column that are not empty belong to; None without such keys.
 Family familyOfColumn(const XQuerySortList& list, size_t k) {
   Family family = Family::None;
+  WorkPacer pacer;
   for (const XQuerySortItem& item : list.items) {
+    pacer.turn();
     const NSObject& key = list.key(item, k);
     if (isEmptyKey(key)) continue;
     const Family own = familyOf(key);
@@ -183,6 +186,7 @@ bool isExactAsDouble(const NSNumber& number) {
 uint32_t commonPrefix(const XQuerySortList& list, size_t k) {
   NSStringView prefix;
   bool isFirst = true;
+  constexpr uint32_t unitsPerStep = 4096;
   for (const XQuerySortItem& item : list.items) {
     const NSObject& key = list.key(item, k);
     if (isEmptyKey(key)) continue;
@@ -191,6 +195,7 @@ uint32_t commonPrefix(const XQuerySortList& list, size_t k) {
     const uint32_t most = std::min(prefix.length(), text.length());
     uint32_t shared = 0;
     while (shared < most && prefix[shared] == text[shared] && text[shared] < beyondASCII) ++shared;
+    checkWork(1 + shared / unitsPerStep);
     prefix = prefix.substring(0, shared);
     if (shared == 0) break;
   }
@@ -204,7 +209,9 @@ class Column {
       : _family(familyOfColumn(list, k)), _tiesAreEqual(_family != Family::Other) {
     if (_family == Family::Strings) _prefix = commonPrefix(list, k);
     _ranks.reserve(list.items.size());
+    WorkPacer pacer;
     for (const XQuerySortItem& item : list.items) {
+      pacer.turn();
       const uint64_t rank = rankOf(list.key(item, k), order.emptyLeast());
       _ranks.push_back(order.ascending() ? rank : ~rank);
     }

@@ -18,6 +18,7 @@
 #include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
 #include "Expr/XQueryUntypedText.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
@@ -131,7 +132,9 @@ class Side {
   bool read(const Value& operand) {
     const XQueryItemList items(operand.get());
     _items.reserve(items.count());
+    WorkPacer pacer;
     for (size_t index = 0; index < items.count(); ++index) {
+      pacer.turn();
       if (!Comparand::isPossible(items[index])) return false;
       _items.emplace_back(items[index]);
     }
@@ -143,7 +146,11 @@ class Side {
 
   template <class Condition>
   bool all(Condition condition) {
-    return std::all_of(_items.begin(), _items.end(), condition);
+    WorkPacer pacer;
+    return std::all_of(_items.begin(), _items.end(), [&](Comparand& item) {
+      pacer.turn();
+      return condition(item);
+    });
   }
 
  private:
@@ -191,7 +198,11 @@ constexpr size_t manyPairs = 64;
 // Whether the relation holds for any pair of keys. Neither list is empty.
 template <class Key>
 bool holdsForAnyPair(XQueryRelation relation, std::vector<Key>& left, std::vector<Key>& right) {
-  const auto below = [](const Key& a, const Key& b) { return orderOf(a, b) < 0; };
+  WorkPacer pacer;
+  const auto below = [&pacer](const Key& a, const Key& b) {
+    pacer.turn();
+    return orderOf(a, b) < 0;
+  };
   if (relation.test == XQueryRelation::Equal) {
     if (relation.negated) {
       // Some pair differs unless all keys of both sides are one and the same.
@@ -219,7 +230,11 @@ Answer compareByKeys(XQueryRelation relation, Side& left, Side& right, KeyOf key
   const auto keysOf = [&keyOf](Side& side) {
     std::vector<Key> keys;
     keys.reserve(side.count());
-    for (size_t index = 0; index < side.count(); ++index) keys.push_back(keyOf(side[index]));
+    WorkPacer pacer;
+    for (size_t index = 0; index < side.count(); ++index) {
+      pacer.turn();
+      keys.push_back(keyOf(side[index]));
+    }
     return keys;
   };
   std::vector<Key> leftKeys = keysOf(left);
@@ -317,8 +332,10 @@ Value XQueryGeneralComparisonShortcut(int type, const Value& left, const Value& 
     const Answer answer = compareManyPairs(XQueryRelationForCode(code), leftSide, rightSide);
     if (answer != Answer::Unknown) return NSNumber::numberWithBool(answer == Answer::Yes);
   }
+  WorkPacer pacer;
   for (size_t i = 0; i < leftSide.count(); ++i) {
     for (size_t j = 0; j < rightSide.count(); ++j) {
+      pacer.turn();
       Value answer = comparePair(code, leftSide[i], rightSide[j], context);
       if (!(answer.get() == NSNumber::falseValue())) return answer;
     }
@@ -334,10 +351,13 @@ Value XQueryGeneralComparisonWithRange(int type, const Value& left, int64_t firs
   const XQueryItemList items(left.get());
   if (items.count() == 0) return Value();
   // An item that cannot be atomized fails before any pair is looked at.
+  WorkPacer pacer;
   for (size_t i = 0; i < items.count(); ++i) {
+    pacer.turn();
     if (!Comparand::isPossible(items[i])) return Value();
   }
   for (size_t i = 0; i < items.count(); ++i) {
+    pacer.turn();
     Comparand item(items[i]);
     const Answer answer = compareWithRange(relation, item, first, last);
     if (answer == Answer::Unknown) return Value();

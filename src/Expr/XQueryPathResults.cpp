@@ -67,7 +67,11 @@ void XQueryPathResults::storeByIdentity(NSObject* item) {
     _arrival = Arrival::Mixed;
     if (_firstResult) _unique.insert(_firstResult.get());
     if (_array) {
-      for (const Value& stored : _array->objects()) _unique.insert(stored.get());
+      WorkPacer pacer;
+      for (const Value& stored : _array->objects()) {
+        pacer.turn();
+        _unique.insert(stored.get());
+      }
     }
   }
   if (_lastStored && !_unique.insert(item)) return;

@@ -9,6 +9,7 @@
 #include "Expr/XQueryLists.h"
 #include "Expr/XQueryPath.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
@@ -44,6 +45,7 @@ bool selects(const Value& result, int64_t position, XQueryContext& context) {
 
 // Whether the predicate keeps the item at the position.
 bool keeps(const XQueryExpr& predicate, NSObject* item, int64_t position, XQueryContext& context) {
+  checkWork();
   auto& dynamic = context._internal();
   dynamic.setContextItem(item, position);
   try {

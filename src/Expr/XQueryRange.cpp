@@ -3,6 +3,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
@@ -76,10 +77,13 @@ Value XQueryRangeIntegers(const XQueryRangeBounds& bounds, XQueryContext& contex
     std::vector<Value>& items = sequence->objects();
     items.reserve(count);
     // Counted by distance: the last integer may be the greatest there is.
+    WorkPacer pacer;
     for (uint64_t offset = 0; offset < count; ++offset) {
+      pacer.turn();
       items.push_back(XQueryNumber::integerWithInt64(static_cast<int64_t>(first + offset)));
     }
   } catch (const std::bad_alloc&) {
+    checkWork();  // it may have been the memory ceiling
     raiseRangeTooLong(context);
   }
   return sequence;

@@ -1,5 +1,7 @@
 #include "Expr/XQuerySequence.h"
 
+#include "Platform/WorkMeter.h"
+
 #include <algorithm>
 #include <vector>
 
@@ -27,7 +29,9 @@ void XQuerySequence::addObject(const Value& item) {
     }
   };
   addOne(item);
+  WorkPacer pacer;
   while (!open.empty()) {
+    pacer.turn();
     Position& top = open.back();
     if (top.next < top.array->count()) {
       addOne(top.array->objects()[top.next++]);
@@ -65,7 +69,9 @@ Value normalised(Value value) {
 
 Value flattened(Value value) {
   if (!value || value->kind() != Kind::Array) return value;  // an XQuerySequence is flat
-  const auto isItem = [](const Value& element) {
+  WorkPacer pacer;
+  const auto isItem = [&pacer](const Value& element) {
+    pacer.turn();
     return element && !isNull(element) && !isa<NSArray>(element);
   };
   const std::vector<Value>& elements = cast<NSArray>(value)->objects();

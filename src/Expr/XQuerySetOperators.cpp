@@ -3,6 +3,7 @@
 #include "Expr/NodeOrder.h"
 #include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/WorkMeter.h"
 #include "xquery/Collection.h"
 
 #include <vector>
@@ -17,7 +18,9 @@ bool gatherNodes(const Value& operand, Nodes& nodes) {
   if (!operand) return false;
   const XQueryItemList items(operand.get());
   nodes.reserve(items.count());
+  WorkPacer pacer;
   for (size_t index = 0; index < items.count(); ++index) {
+    pacer.turn();
     NSObject* item = items[index];
     if (!item || !item->isNode()) return false;
     nodes.push_back(item);
@@ -29,7 +32,9 @@ bool gatherNodes(const Value& operand, Nodes& nodes) {
 template <class Wanted>
 void appendDistinct(const Nodes& nodes, XQueryIdentitySet& seen, std::vector<Value>& result,
                     Wanted wanted) {
+  WorkPacer pacer;
   for (NSObject* node : nodes) {
+    pacer.turn();
     if (wanted(node) && seen.insert(node)) result.emplace_back(node);
   }
 }
@@ -44,7 +49,11 @@ std::vector<Value> combine(int type, const Nodes& left, const Nodes& right) {
     return result;
   }
   XQueryIdentitySet rightSet;
-  for (const NSObject* node : right) rightSet.insert(node);
+  WorkPacer pacer;
+  for (const NSObject* node : right) {
+    pacer.turn();
+    rightSet.insert(node);
+  }
   const bool wantsCommon = type == XQueryOperatorIntersect;
   appendDistinct(left, seen, result,
                  [&](const NSObject* node) { return rightSet.contains(node) == wantsCommon; });

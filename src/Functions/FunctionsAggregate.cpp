@@ -3,6 +3,7 @@
 #include "Expr/XQueryArithmetic.h"
 #include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
@@ -34,6 +35,7 @@ bool isNumberOrDate(const Value& item) {
 Value sumOf(const XQueryItemList& items, XQueryContext& context) {
   Value sum;
   for (size_t index = 0; index < items.count(); ++index) {
+    checkWork();
     Value item = itemToAggregate(items[index], context);
     if (isNaN(item)) return item;
     if (index > 0) {

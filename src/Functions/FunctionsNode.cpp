@@ -2,6 +2,7 @@
 
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNodeFunctions.h"
@@ -38,6 +39,7 @@ Value nameAsString(const Value& item, NameOf nameOf, XQueryContext& context) {
 Value typedMembers(const NSArray& members) {
   XQueryGatherer values;
   for (const Value& member : members.objects()) {
+    checkWork();
     if (isNull(member)) continue;
     if (const auto* node = dyn_cast<NSXMLNode>(member.get())) {
       values.add(XQueryNodeTypedValue(node));

@@ -2,6 +2,7 @@
 
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryValueSet.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"
@@ -64,6 +65,7 @@ Value fn_distinct_values(const Value* arguments, size_t count, XQueryContext& co
   XQueryValueSet met;
   XQueryGatherer kept;
   for (size_t index = 0; index < items.count(); ++index) {
+    checkWork();
     NSObject* item = items[index];
     // The text of an untyped item is the string's, so a repeated one needs no cast.
     if (!met.insert(*item)) continue;

@@ -44,6 +44,8 @@ class BigInteger {
   int64_t int64() const { return mpz_get_si(_value); }
   bool fitsUInt64() const { return mpz_fits_ulong_p(_value) != 0; }
   uint64_t uint64() const { return mpz_get_ui(_value); }
+  // What holding the value takes.
+  size_t bytes() const { return mpz_size(_value) * sizeof(mp_limb_t) + sizeof(*this); }
   // The number of decimal digits, or one more; fast.
   size_t digitsAtMost() const { return mpz_sizeinbase(_value, 10); }
   size_t digits() const;

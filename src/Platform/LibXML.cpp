@@ -1,5 +1,7 @@
 #include "Platform/LibXML.h"
 
+#include "Platform/WorkMeter.h"
+
 #include <libxml/parser.h>
 #include <libxml/parserInternals.h>
 #include <libxml/SAX2.h>
@@ -9,6 +11,7 @@
 #include <algorithm>
 #include <climits>
 #include <cstring>
+#include <exception>
 #include <memory>
 #include <mutex>
 #include <new>
@@ -18,7 +21,8 @@ namespace xquery {
 namespace {
 
 // One parse. Exceptions do not cross libxml2's C frames: a callback that fails notes the failure
-// and stops the parser, and every callback that is still called afterwards does nothing. The
+// and stops the parser, and every callback that is still called afterwards does nothing. Only the
+// end of an evaluation that the parse is part of is thrown on, when libxml2 has returned. The
 // content of an entity is parsed by an inner parser of libxml2's, which calls the same functions.
 class Parse {
  public:
@@ -73,9 +77,11 @@ class Parse {
   int _namespaceEntries = 0;  // of the parser's, before the tag at hand
   bool _reachedEnd = false;
   bool _failed = false;
+  std::exception_ptr _ended;
 };
 
 constexpr const char* outOfMemory = "out of memory";
+constexpr size_t bytesPerStep = 1024;
 constexpr const char* tooMuchText = "entities expand to too much text";
 
 std::string_view viewOf(const xmlChar* text, size_t length) {
@@ -137,9 +143,13 @@ int Parse::readInput(void* self, char* buffer, int size) {
   if (parse._failed || parse._reachedEnd) return 0;
   ptrdiff_t count = -1;
   try {
+    checkWork(static_cast<size_t>(size) / bytesPerStep + 1);
     count = parse._read(buffer, static_cast<size_t>(size));
   } catch (const std::bad_alloc&) {
     parse.note(outOfMemory, 0, 0);
+  } catch (...) {
+    parse._ended = std::current_exception();
+    parse.note("the evaluation has ended", 0, 0);
   }
   if (count < 0) {
     parse.note("the input cannot be read", 0, 0);
@@ -320,6 +330,7 @@ bool Parse::run() {
   _parser = parser.get();
   xmlCtxtUseOptions(_parser, XML_PARSE_HUGE | XML_PARSE_NOENT | XML_PARSE_NONET);
   const bool isWellFormed = xmlParseDocument(_parser) == 0 && _parser->wellFormed;
+  if (_ended) std::rethrow_exception(_ended);
   if (!_failed && !isWellFormed) fail(nullptr);
   if (!_failed && !hasReadAll()) fail("extra content at the end of the document");
   return !_failed;

@@ -1,5 +1,7 @@
 #include "Platform/LocalFile.h"
 
+#include "Platform/WorkMeter.h"
+
 #include <cerrno>
 #include <climits>
 #include <cstring>
@@ -48,6 +50,7 @@ std::optional<std::string> readAll(const Descriptor& file, uint64_t size, uint64
   if (size <= mostBytes) data.reserve(size);
   char piece[65536];
   for (;;) {
+    checkWork();
     const ssize_t count = ::read(file.number(), piece, sizeof piece);
     if (count < 0 && errno == EINTR) continue;
     if (count < 0) failure = std::strerror(errno);

@@ -48,7 +48,8 @@ uint32_t checkedLength(size_t length) {
   return static_cast<uint32_t>(length);
 }
 
-void appendPoint(std::u16string& out, char32_t point) {
+template <class Text>
+void appendPoint(Text& out, char32_t point) {
   if (point < 0x10000) {
     out += static_cast<char16_t>(point);
   } else {
@@ -122,7 +123,7 @@ NSString::~NSString() {
   } else if (_flags & Shared) {
     static_cast<const NSString*>(_external.owner)->release();
   } else {
-    ::operator delete(const_cast<void*>(_external.units));
+    freeValueMemory(const_cast<void*>(_external.units), byteCount(view()));
   }
 }
 
@@ -134,7 +135,7 @@ void NSString::copyUnits(NSStringView text) {
   if (bytes <= inlineBytes) {
     _flags |= Inline;
   } else {
-    units = ::operator new(bytes);
+    units = allocateValueMemory(bytes);
     _external = {units, nullptr};
   }
   if (_length == 0) return;

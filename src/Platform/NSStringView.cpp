@@ -2,6 +2,7 @@
 //
 // Both representations give the same answers. 8-bit text against 8-bit text, the common case, goes
 // through the C library's byte functions; the other pairings share one implementation per question.
+#include "Platform/WorkMeter.h"
 #include "xquery/String.h"
 
 #include <algorithm>
@@ -17,6 +18,12 @@ bool isHighSurrogate(char16_t unit) {
 }
 bool isLowSurrogate(char16_t unit) {
   return unit >= 0xDC00 && unit < 0xE000;
+}
+
+// After so many units were looked at: only long texts are work of their own.
+void checkUnits(uint32_t count) {
+  constexpr uint32_t unitsPerStep = 8192;
+  if (count >= unitsPerStep) checkWork(count / unitsPerStep);
 }
 
 template <class Unit>
@@ -189,16 +196,21 @@ NSStringView NSStringView::substring(uint32_t from, uint32_t count) const {
 uint32_t NSStringView::find(NSStringView text, uint32_t from) const {
   if (from > _length || text._length > _length - from) return notFound;
   if (text.isEmpty()) return from;
-  return withUnits(*this, [&](auto* units) {
+  const uint32_t found = withUnits(*this, [&](auto* units) {
     return withUnits(text, [&](auto* pattern) {
       return findUnits(units, _length, pattern, text._length, from);
     });
   });
+  checkUnits((found == notFound ? _length : found) - from);
+  return found;
 }
 
 uint32_t NSStringView::find(char16_t unit, uint32_t from) const {
   if (from >= _length) return notFound;
-  return withUnits(*this, [&](auto* units) { return findUnit(units, _length, unit, from); });
+  const uint32_t found =
+      withUnits(*this, [&](auto* units) { return findUnit(units, _length, unit, from); });
+  checkUnits((found == notFound ? _length : found) - from);
+  return found;
 }
 
 bool NSStringView::startsWith(NSStringView text) const {
@@ -214,6 +226,7 @@ int NSStringView::compare(NSStringView other) const {
   const uint32_t index = withUnits(*this, [&](auto* a) {
     return withUnits(other, [&](auto* b) { return firstDifference(a, b, common); });
   });
+  checkUnits(index);
   if (index == common) {
     return _length == other._length ? 0 : _length < other._length ? -1 : 1;
   }
@@ -228,16 +241,19 @@ int NSStringView::compare(NSStringView other) const {
 
 bool NSStringView::equals(NSStringView other) const {
   if (_length != other._length) return false;
+  checkUnits(_length);
   return withUnits(*this, [&](auto* a) {
     return withUnits(other, [&](auto* b) { return sameUnits(a, b, _length); });
   });
 }
 
 uint32_t NSStringView::hash() const {
+  checkUnits(_length);
   return withUnits(*this, [&](auto* units) { return hashUnits(units, _length); });
 }
 
 void NSStringView::appendUTF8To(std::string& out) const {
+  checkUnits(_length);
   if (!_wide) {
     out.append(asciiUnits(), _length);
     return;

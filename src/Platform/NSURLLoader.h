@@ -2,6 +2,7 @@
 // fetched.
 #pragma once
 
+#include "Platform/WorkMeter.h"
 #include "xquery/Data.h"
 #include "xquery/Loading.h"
 #include "xquery/Object.h"
@@ -50,8 +51,8 @@ class NSURLLoader : public NSCounted {
   [[nodiscard]] static Ref<NSURLLoader> loaderWithLoading(XQueryLoading loading = {});
 
   const XQueryLoading& loading() const { return _loading; }
-  // Called at least every 50 ms while the network is waited for. What it throws ends the load and
-  // passes through.
+  // Called at least every 50 ms while the network is waited for; unless another is set, the one
+  // that ends an evaluation at its limits. What it throws ends the load and passes through.
   void setCheckpoint(std::function<void()> checkpoint) { _checkpoint = std::move(checkpoint); }
 
   // Nothing when the URL may not be loaded, when it cannot be reached, and past the limits. A
@@ -78,7 +79,7 @@ class NSURLLoader : public NSCounted {
   bool mayFollow(const std::string& redirectURL);
 
   XQueryLoading _loading;
-  std::function<void()> _checkpoint;
+  std::function<void()> _checkpoint = lookAtWork;
   std::string _failure;
   NSURLTable<Ref<NSURLHandle>> _handles[4];  // by purpose
 };

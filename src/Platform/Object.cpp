@@ -12,6 +12,8 @@
 // Under a sanitizer every block comes from malloc, so that it sees each of them.
 #include "xquery/Object.h"
 
+#include "Platform/WorkMeter.h"
+
 #include <algorithm>
 #include <cstdlib>
 #include <mutex>
@@ -206,6 +208,7 @@ bool pushPending(const NSCounted* object) {
 }  // namespace
 
 void* NSCounted::operator new(size_t size) {
+  countValueBytes(size);
   if (!usesFreeLists || size > largestBlock) return ::operator new(size);
   const size_t sizeIndex = (size - 1) / granule;
   BlockList& blocks = threadState.lists[sizeIndex];
@@ -219,6 +222,7 @@ void* NSCounted::operator new(size_t size) {
 }
 
 void NSCounted::operator delete(void* block, size_t size) noexcept {
+  uncountValueBytes(size);
   if (!usesFreeLists || size > largestBlock) {
     ::operator delete(block, size);
     return;

@@ -1,5 +1,6 @@
 // Deep copies. The copy is a tree of its own, numbered as it is built; its elements keep their own
 // namespace declarations and every name its URI, so nothing is looked up above the original.
+#include "Platform/WorkMeter.h"
 #include "Platform/XMLNames.h"
 #include "Platform/XMLTreeBuilder.h"
 #include "xquery/XMLNode.h"
@@ -98,7 +99,9 @@ void Copier::visit(const NSXMLNode* node) {
 
 NSXMLNode* Copier::copy() {
   const NSXMLNode* node = _root;
+  WorkPacer pacer;
   while (true) {
+    pacer.turn();
     visit(node);
     if (const NSXMLNode* child = node->firstChild()) {
       node = child;

@@ -2,6 +2,7 @@
 // children.
 #include "xquery/XMLNode.h"
 
+#include "Platform/WorkMeter.h"
 #include "Platform/XMLNames.h"
 #include "Platform/XMLTree.h"
 
@@ -24,9 +25,23 @@ bool isTextOf(const NSXMLNode* node) {
 }
 
 // The first text node from `node` on that comes before `end`.
-const NSXMLNode* textFrom(const NSXMLNode* node, const NSXMLNode* end) {
-  while (node != end && !isTextOf(node)) node = node->nextNode();
+const NSXMLNode* textFrom(const NSXMLNode* node, const NSXMLNode* end, WorkPacer& pacer) {
+  for (; node != end && !isTextOf(node); node = node->nextNode()) pacer.turn();
+  pacer.turn();
   return node == end ? nullptr : node;
+}
+
+void appendTexts(const NSXMLNode* branch, NSMutableString& out, WorkPacer& pacer) {
+  const NSXMLNode* end = NSXMLTree::endOfSubtree(branch);
+  const NSXMLNode* text = textFrom(branch, end, pacer);
+  for (; text; text = textFrom(text->nextNode(), end, pacer)) out.append(text->textView());
+}
+
+// For a way through `count` nodes of a tree that no pacer counted.
+void chargeWay(int64_t count) {
+  if (count >= WorkPacer::turnsPerStep) {
+    chargeWork(static_cast<uint64_t>(count) / WorkPacer::turnsPerStep);
+  }
 }
 
 }  // namespace
@@ -51,7 +66,9 @@ NSXMLNode* NSXMLNode::childAtIndex(uint32_t index) const {
 
 NSXMLNode* NSXMLNode::rootNode() const {
   const NSXMLNode* node = this;
-  while (node->_parent) node = node->_parent;
+  int64_t way = 0;
+  for (; node->_parent; node = node->_parent) ++way;
+  chargeWay(way);
   return changeable(node);
 }
 
@@ -62,6 +79,7 @@ NSXMLDocument* NSXMLNode::rootDocument() const {
 int64_t NSXMLNode::level() const {
   int64_t count = 0;
   for (const NSXMLNode* node = _parent; node; node = node->_parent) ++count;
+  chargeWay(count);
   return count;
 }
 
@@ -73,6 +91,7 @@ int64_t NSXMLNode::index() const {
     for (const NSXMLNode* node = this; node; node = node->_next) --place;
   } else {
     for (const NSXMLNode* node = _parent->_firstChild; node != this; node = node->_next) ++place;
+    chargeWay(place);
   }
   return place;
 }
@@ -136,12 +155,15 @@ NSStringView NSXMLNode::textView() const {
 
 Ref<NSString> NSXMLNode::stringValue() const {
   if (!isBranch()) return NSString::stringInTreeOf(this, textView());
+  WorkPacer pacer;
   const NSXMLNode* end = NSXMLTree::endOfSubtree(this);
-  const NSXMLNode* first = textFrom(this, end);
+  const NSXMLNode* first = textFrom(this, end, pacer);
   if (!first) return NSString::empty();
-  if (!textFrom(first->nextNode(), end)) return NSString::stringInTreeOf(first, first->textView());
+  if (!textFrom(first->nextNode(), end, pacer)) {
+    return NSString::stringInTreeOf(first, first->textView());
+  }
   NSMutableString text;
-  appendStringValueTo(text);
+  appendTexts(this, text, pacer);
   return text.string();
 }
 
@@ -150,10 +172,8 @@ void NSXMLNode::appendStringValueTo(NSMutableString& out) const {
     out.append(textView());
     return;
   }
-  const NSXMLNode* end = NSXMLTree::endOfSubtree(this);
-  for (const NSXMLNode* text = textFrom(this, end); text; text = textFrom(text->nextNode(), end)) {
-    out.append(text->textView());
-  }
+  WorkPacer pacer;
+  appendTexts(this, out, pacer);
 }
 
 // --- changes ---------------------------------------------------------------------------------

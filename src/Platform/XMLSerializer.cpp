@@ -12,6 +12,7 @@
 // What XML cannot contain (control characters, lone surrogates) is written as U+FFFD, and comments
 // and processing instructions that would end early are written with a space in between, so that
 // the output is always well formed.
+#include "Platform/WorkMeter.h"
 #include "Platform/XMLNames.h"
 #include "Platform/XMLTree.h"
 #include "xquery/XMLNode.h"
@@ -267,6 +268,7 @@ class Serializer {
 void Serializer::run() {
   const NSXMLNode* node = _root;
   while (!_out.isStopped()) {
+    checkWork();
     open(node);
     if (const NSXMLNode* child = node->firstChild()) {
       node = child;
@@ -416,6 +418,7 @@ class UsedPrefixes {
   explicit UsedPrefixes(const NSXMLElement* root) {
     const NSXMLNode* end = NSXMLTree::endOfSubtree(root);
     for (const NSXMLNode* node = root; node != end; node = node->nextNode()) {
+      checkWork();
       const auto* element = dyn_cast<NSXMLElement>(node);
       if (!element) continue;
       add(element);

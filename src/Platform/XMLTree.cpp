@@ -1,11 +1,13 @@
 #include "Platform/XMLTree.h"
 
+#include "Platform/WorkMeter.h"
 #include "Platform/XMLNames.h"
 #include "Platform/XMLTreeExtra.h"
 
 #include <algorithm>
 #include <cstdlib>
 #include <limits>
+#include <malloc.h>
 #include <mutex>
 #include <new>
 
@@ -65,6 +67,16 @@ NSStringView copyText(void* memory, NSStringView text, bool narrow) {
   return {units, text.length()};
 }
 
+// Of a block of malloc's just got. The block does not note its size, but malloc does.
+void countLargeBlock(void* block) {
+  try {
+    countValueBlock(malloc_usable_size(block));
+  } catch (...) {
+    std::free(block);
+    throw;
+  }
+}
+
 // Renumbering is rare and short, so that trees share a few locks.
 std::mutex& orderLock(const NSXMLTree* tree) {
   static std::mutex locks[16];
@@ -99,6 +111,7 @@ void NSXMLTree::freeBlocks() {
     if (const size_t sizeClass = block->next & sizeClassBits) {
       NSCounted::operator delete(block, sizeClass* blockGranule);
     } else {
+      uncountValueBytes(malloc_usable_size(block));
       std::free(block);
     }
     block = next;
@@ -152,6 +165,7 @@ NSXMLBlock* NSXMLTree::allocateBlock(size_t bytes) {
   const bool isSmall = size <= largestSmallBlock;
   void* memory = isSmall ? NSCounted::operator new(size) : std::malloc(size);
   if (!memory) throw std::bad_alloc();
+  if (!isSmall) countLargeBlock(memory);
   auto* block = ::new (memory) NSXMLBlock{this, isSmall ? size / blockGranule : 0};
   if (_lastBlock) {
     setNextBlock(block, nextBlock(_lastBlock));
@@ -498,7 +512,9 @@ void NSXMLTree::detach(NSXMLNode* node) {
 
 void NSXMLTree::renumber(const NSXMLNode* root) {
   uint32_t number = firstOrderNumber;
+  WorkPacer pacer;  // what is left half done stays stale
   for (const NSXMLNode* node = root; node; node = node->nextNode()) {
+    pacer.turn();
     if (node != root) node->_word = number;
     ++number;
     const auto* element = dyn_cast<NSXMLElement>(node);

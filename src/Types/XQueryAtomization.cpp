@@ -1,6 +1,7 @@
 #include "Types/XQueryAtomization.h"
 
 #include "Eval/XQueryContextInternal.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryNumber.h"
@@ -16,7 +17,9 @@ namespace {
 }
 
 bool allAtomic(const std::vector<Value>& items) {
+  WorkPacer pacer;
   for (const Value& item : items) {
+    pacer.turn();
     if (!XQueryIsAtomicType(item.get())) return false;
   }
   return true;
@@ -28,7 +31,9 @@ Value typedValues(const Value& sequence, XQueryContext& context) {
   if (allAtomic(items)) return sequence;
   std::vector<Value> values;
   values.reserve(items.size());
+  WorkPacer pacer;
   for (const Value& item : items) {
+    pacer.turn();
     if (!isa<NSNull>(item)) values.push_back(XQueryTypedValue(item, context));
   }
   if (values.empty()) return NSNull::null();

@@ -53,6 +53,9 @@ namespace XQueryErrors {
 
 inline constexpr XQueryErrorText<> nestedTooDeeply{0, "limit: expression nested too deeply"};
 inline constexpr XQueryErrorText<> outOfMemory{0, "limit: out of memory"};
+inline constexpr XQueryErrorText<> deadlinePassed{0, "limit: deadline passed"};
+inline constexpr XQueryErrorText<> evaluationCancelled{0, "limit: evaluation cancelled"};
+inline constexpr XQueryErrorText<> memoryCeilingReached{0, "limit: memory ceiling reached"};
 inline constexpr XQueryErrorText<> tooManyDigits{0, "limit: number of too many digits"};
 inline constexpr XQueryErrorText<> rangeTooLong{0, "limit: range of too many items"};
 

@@ -1,6 +1,7 @@
 // Every walk here is a loop: a tree may be a million elements deep.
 #include "Types/XQueryNodeFunctions.h"
 
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryNumber.h"
 
 #include <unordered_map>
@@ -20,7 +21,9 @@ using PrefixSet = std::unordered_set<NSStringView, TextHash>;
 template <class Visit>
 bool visitNamespaces(const NSXMLNode* node, Visit visit) {
   PrefixSet seen;
+  WorkPacer pacer;
   for (; node; node = node->parent()) {
+    pacer.turn();
     const NSXMLElement* element = dyn_cast<NSXMLElement>(node);
     if (!element) continue;
     for (NSXMLNode* declaration = element->firstNamespace(); declaration;
@@ -119,7 +122,9 @@ bool sameChildren(const NSXMLNode* rootA, const NSXMLNode* rootB) {
   const NSXMLNode* parentB = rootB;
   const NSXMLNode* a = skipUncompared(parentA->firstChild());
   const NSXMLNode* b = skipUncompared(parentB->firstChild());
+  WorkPacer pacer;
   while (true) {
+    pacer.turn();
     if (!a || !b) {
       if (a || b) return false;
       if (parentA == rootA) return true;
@@ -159,7 +164,9 @@ Ref<NSString> XQueryNodeTypedValue(const NSXMLNode* node) {
 
 void XQueryNodeAddChildTextValues(const NSXMLNode* node, NSMutableString& text) {
   const NSXMLNode* current = node ? node->firstChild() : nullptr;
+  WorkPacer pacer;
   while (current) {
+    pacer.turn();
     if (current->kind() == Kind::Text) text.append(current->textView());
     const NSXMLNode* next = current->kind() == Kind::Element ? current->firstChild() : nullptr;
     while (!next && current != node) {
@@ -179,7 +186,9 @@ Ref<NSString> XQueryNodeTypeName(const NSXMLNode*) {
 }
 
 Ref<NSString> XQueryNodeLanguage(const NSXMLNode* node) {
+  WorkPacer pacer;
   for (; node && node->kind() != Kind::Document; node = node->parent()) {
+    pacer.turn();
     if (const NSXMLNode* language = attributeNamed(node, "xml:lang")) {
       return language->stringValue();
     }
@@ -190,7 +199,9 @@ Ref<NSString> XQueryNodeLanguage(const NSXMLNode* node) {
 // A base URI is taken as written: relative ones are not resolved against outer ones, and the
 // document's own URI plays no part.
 Ref<NSString> XQueryNodeBaseURI(const NSXMLNode* node) {
+  WorkPacer pacer;
   while (node) {
+    pacer.turn();
     if (node->kind() == Kind::Document) {
       node = cast<NSXMLDocument>(node)->rootElement();
       continue;
@@ -217,7 +228,9 @@ NSXMLNode* XQueryNodeRoot(const NSXMLNode* node) {
 // The outermost declaration of the prefix wins, not the nearest, and the last one of an element.
 Ref<NSString> XQueryNodeNamespaceForPrefix(const NSXMLNode* node, NSStringView prefix) {
   const NSXMLNode* found = nullptr;
+  WorkPacer pacer;
   for (; node; node = node->parent()) {
+    pacer.turn();
     const NSXMLElement* element = dyn_cast<NSXMLElement>(node);
     if (!element) continue;
     for (const NSXMLNode* declaration = element->firstNamespace(); declaration;

@@ -1,5 +1,6 @@
 #include "Types/XQueryValues.h"
 
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryBinary.h"
 #include "Types/XQueryDate.h"
 #include "Types/XQueryDuration.h"
@@ -28,6 +29,7 @@ void describeSequence(const NSArray& sequence, NSMutableString& text, int depth)
     text.appendASCII("...");
   } else {
     for (size_t index = 0; index < sequence.count(); ++index) {
+      checkWork();
       if (index > 0) text.appendASCII(", ");
       describe(sequence.objectAtIndex(index), text, depth - 1);
     }

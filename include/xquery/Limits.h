@@ -1,0 +1,47 @@
+// What an evaluation may take before it is ended.
+//
+// Reaching a limit ends the evaluation with error 0 and a message that begins with "limit: ". No
+// limit is set unless the host sets one; two hold always: nesting, by the stack of the calling
+// thread ("limit: expression nested too deeply"), and the memory of the machine.
+//
+//   XQueryLimits limits;
+//   limits.duration = std::chrono::seconds(2);
+//   limits.cancelled = std::make_shared<std::atomic<bool>>(false);
+//   limits.memoryCeiling = 512 * 1024 * 1024;
+//   context->contextSetLimits(limits);
+//   ... on another thread: limits.cancelled->store(true);
+//
+// Time and flag are looked at often enough that an evaluation stops within a tenth of a second;
+// giving back the memory of very large results comes on top, tens of nanoseconds per value.
+#pragma once
+
+#include <atomic>
+#include <chrono>
+#include <cstdint>
+#include <memory>
+#include <optional>
+
+namespace xquery {
+
+struct XQueryLimits {
+  // How long one evaluation may take: "limit: deadline passed". Counted from its beginning; zero or
+  // less ends it at once.
+  std::optional<std::chrono::nanoseconds> duration;
+  // The time after which no evaluation goes on; with a duration as well the earlier one counts.
+  std::optional<std::chrono::steady_clock::time_point> deadline;
+  // Another thread sets it to end the evaluation, and those that begin while it is set: "limit:
+  // evaluation cancelled". The engine never clears it; several contexts may share one. Null for
+  // none.
+  std::shared_ptr<std::atomic<bool>> cancelled;
+  // Bytes that the values made by one evaluation may take at a time: "limit: memory ceiling
+  // reached". Counted are atomic values and their texts and digits, sequences, constructed nodes,
+  // documents read while evaluating, texts being put together, and frames of variables; what is
+  // freed again no longer counts. Not counted are what exists before the evaluation begins, the
+  // stack, tables of names, and lists that are kept only while a path, a comparison or a sort is
+  // worked out, which are in proportion to what they work on. A block of 64 KiB or more that would
+  // exceed the ceiling is not made; smaller ones may exceed it by some megabytes before it is
+  // noticed.
+  std::optional<uint64_t> memoryCeiling;
+};
+
+}  // namespace xquery

@@ -1,0 +1,85 @@
+#include "Eval/LimitWatch.h"
+
+#include "Eval/XQueryContextInternal.h"
+
+#include <algorithm>
+
+namespace xquery {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+// A step is at most about ten microseconds: a look every few milliseconds at the latest, and at the
+// earliest, with steps of a nanosecond, once in the time that reading the clock forty times takes.
+constexpr int64_t stepsPerLook = 1024;
+
+std::optional<Clock::time_point> deadlineOf(const XQueryLimits& limits) {
+  std::optional<Clock::time_point> deadline = limits.deadline;
+  if (!limits.duration) return deadline;
+  const Clock::time_point now = Clock::now();
+  // A duration that the clock cannot count is none.
+  if (*limits.duration > Clock::time_point::max() - now) return deadline;
+  const Clock::time_point end = now + *limits.duration;
+  return deadline ? std::min(*deadline, end) : end;
+}
+
+int64_t mostBytes(const XQueryLimits& limits, int64_t inUse) {
+  const uint64_t room = static_cast<uint64_t>(INT64_MAX) - static_cast<uint64_t>(inUse);
+  if (!limits.memoryCeiling || *limits.memoryCeiling > room) return INT64_MAX;
+  return static_cast<int64_t>(static_cast<uint64_t>(inUse) + *limits.memoryCeiling);
+}
+
+}  // namespace
+
+XQueryLimitWatch::XQueryLimitWatch(XQueryContext& context)
+    : _context(context),
+      _limits(context.contextLimits()),
+      _deadline(deadlineOf(_limits)),
+      _outer(workMeter) {
+  WorkMeter& meter = workMeter;
+  meter.stepsLeft = stepsBetweenLooks();
+  meter.mostValueBytes = mostBytes(_limits, meter.valueBytes);
+  meter.wasRefused = false;
+  meter.watcher = this;
+}
+
+XQueryLimitWatch::~XQueryLimitWatch() {
+  WorkMeter& meter = workMeter;
+  meter.stepsLeft = _outer.stepsLeft;
+  meter.mostValueBytes = _outer.mostValueBytes;
+  meter.wasRefused = _outer.wasRefused;
+  meter.watcher = _outer.watcher;
+}
+
+int64_t XQueryLimitWatch::stepsBetweenLooks() const {
+  const bool isLimited = _deadline || _limits.cancelled || _limits.memoryCeiling;
+  return isLimited ? stepsPerLook : WorkMeter::manySteps;
+}
+
+const XQueryErrorText<>* XQueryLimitWatch::reachedLimit() const {
+  if (_limits.cancelled && _limits.cancelled->load(std::memory_order_relaxed)) {
+    return &XQueryErrors::evaluationCancelled;
+  }
+  if (_deadline && Clock::now() >= *_deadline) return &XQueryErrors::deadlinePassed;
+  const WorkMeter& meter = workMeter;
+  const bool exceedsCeiling = meter.wasRefused || meter.valueBytes > meter.mostValueBytes;
+  return exceedsCeiling ? &XQueryErrors::memoryCeilingReached : nullptr;
+}
+
+void XQueryLimitWatch::lookAtWork() {
+  workMeter.stepsLeft = stepsBetweenLooks();
+  if (_isRaising) return;  // making the error is work, too
+  if (!_reached) _reached = reachedLimit();
+  if (!_reached) return;
+  _isRaising = true;
+  const Ref<XQueryError> error = _reached->error();
+  _isRaising = false;
+  workMeter.stepsLeft = 0;
+  _context._internal().raise(error);
+}
+
+const XQueryErrorText<>& XQueryLimitWatch::allocationFailure() const {
+  return workMeter.wasRefused ? XQueryErrors::memoryCeilingReached : XQueryErrors::outOfMemory;
+}
+
+}  // namespace xquery
