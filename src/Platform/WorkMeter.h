@@ -5,13 +5,29 @@
 // thread is asked and may throw. So a step costs one subtraction, and clocks and flags are looked
 // at often enough to end any evaluation within a fraction of a tenth of a second.
 //
-//   chargeWork(n)       counts; never throws; for code that must not be interrupted
 //   checkWork(n)        counts, and asks the watcher when it is due; may throw NSException
 //   WorkPacer           one step for each so many turns of a tight loop
+//   chargeWork(n)       counts; never throws; for code that must not be interrupted
+//
+// Evaluating an expression and calling a function count a step by themselves, so only what repeats
+// inside one call needs more:
+//
+//   WorkPacer pacer;                        // a local: a turn is one decrement of a register
+//   for (const Value& item : items) {
+//     pacer.turn();                         // turns of some tens of nanoseconds
+//     ...
+//   }
+//   for (...) { checkWork(); sort(part); }  // turns of about a microsecond and more
+//   checkWork(bytes / 4096);                // before or after a pass in C over so many bytes
+//
+// What throws may be thrown on through any C++ frame but not through frames of C: a callback that a
+// C library calls must catch it, end the library's work and throw it on afterwards. Whoever catches
+// every exception need not look for it: the watcher throws again at the next look.
 //
 // The bytes counted are those that the thread took for values less those that it gave back: counted
 // objects, texts, lists of values, blocks of trees, digits of large numbers. They may be negative,
-// since a thread may free what another one made; only differences mean anything.
+// since a thread may free what another one made; only differences mean anything. A new object whose
+// memory is large and not made of such parts counts it with countValueBlock and uncountValueBytes.
 #pragma once
 
 #include <cstddef>
