@@ -54,5 +54,46 @@ TEST(Position, OfTheContextItemOfTheWholeQueryIsOne) {
             "error 17 line 1 invalid arguments to function - last");
 }
 
+// --- the static context --------------------------------------------------------------------------
+
+TEST(StaticBaseURI, IsTheDeclaredOne) {
+  EXPECT_EQ(answer("declare base-uri 'http://h/a'; static-base-uri()"), "anyURI http://h/a");
+  EXPECT_EQ(answer("declare base-uri 'a/b'; static-base-uri()"), "anyURI a/b");
+}
+
+TEST(StaticBaseURI, UndeclaredOrEmptyIsNone) {
+  EXPECT_EQ(answer("static-base-uri()"), "");
+  EXPECT_EQ(answer("declare base-uri ''; static-base-uri()"), "");
+}
+
+TEST(StaticBaseURI, ThatIsNoURIIsAFailedCast) {
+  EXPECT_EQ(answer("declare base-uri 'a b'; static-base-uri()"),
+            "error 6 line 0 value does not match a required type");
+}
+
+TEST(DefaultCollation, IsTheDeclaredOneAsAString) {
+  EXPECT_EQ(answer("declare default collation 'urn:c'; default-collation()"), "string urn:c");
+  EXPECT_EQ(answer("declare default collation 'no uri'; default-collation()"), "string no uri");
+}
+
+TEST(DefaultCollation, UndeclaredIsTheEmptyString) {
+  EXPECT_EQ(answer("default-collation()"), "string ");
+}
+
+TEST(ImplicitTimezone, IsTheLocalOffsetAsADuration) {
+  const std::string zone = call(fn_implicit_timezone, {});
+  EXPECT_EQ(zone, show(XQueryNumber::implicitTimeZone()));
+  EXPECT_EQ(zone.substr(0, 16), "dayTimeDuration ");
+}
+
+TEST(StaticContext, FunctionsTakeNoArguments) {
+  for (const char* name : {"static-base-uri", "default-collation", "implicit-timezone"}) {
+    EXPECT_EQ(answer(std::string(name) + "(())"),
+              "error 17 line 1 invalid arguments to function - " + std::string(name));
+    EXPECT_EQ(answer(std::string(name) + "(1, 2)"),
+              "error 17 line 1 invalid arguments to function - " + std::string(name));
+  }
+}
+
 }  // namespace
 }  // namespace xquery

@@ -191,6 +191,180 @@ TEST(Name, TakesUpToOneArgument) {
   EXPECT_EQ(refusedCounts(fn_local_name, node, 5, node), "2 3 4 5");
 }
 
+// --- namespace-uri -------------------------------------------------------------------------------
+
+TEST(NamespaceURI, IsTheNodesNamespace) {
+  const Value tree = document("<p:a xmlns:p='urn:p' xmlns='urn:d' p:b='1' c='2'><d/></p:a>");
+  EXPECT_EQ(answer("namespace-uri(*), */@*/namespace-uri(.), namespace-uri(*/*)", tree),
+            "anyURI urn:p, anyURI urn:p, anyURI , anyURI urn:d");
+}
+
+TEST(NamespaceURI, OfANodeWithoutOneIsEmpty) {
+  const Value tree = document("<a>t<?pi x?><!--c--></a>");
+  EXPECT_EQ(answer("namespace-uri(/), namespace-uri(a), a/node()/namespace-uri(.)", tree),
+            "anyURI , anyURI , anyURI , anyURI , anyURI ");
+}
+
+TEST(NamespaceURI, OfTheEmptySequenceIsEmptyAndOfWhatIsNoNodeRefused) {
+  EXPECT_EQ(call(fn_namespace_uri, {empty()}), "anyURI ");
+  EXPECT_EQ(call(fn_namespace_uri, {string("a")}), "null");
+  EXPECT_EQ(call(fn_namespace_uri, {sequence({elementFrom("<a/>"), elementFrom("<b/>")})}), "null");
+}
+
+TEST(NamespaceURI, ThatIsNoURIIsAFailedCast) {
+  EXPECT_EQ(answer("namespace-uri(<a xmlns='a b'/>)"),
+            "error 6 line 0 value does not match a required type");
+}
+
+TEST(NamespaceURI, WithoutArgumentsIsOfTheContextItem) {
+  EXPECT_EQ(call(fn_namespace_uri, {}, elementFrom("<a xmlns='urn:d'/>")), "anyURI urn:d");
+  EXPECT_EQ(call(fn_namespace_uri, {}, integer(1)), "null");
+  EXPECT_EQ(call(fn_namespace_uri, {}), "null");
+}
+
+TEST(NamespaceURI, TakesUpToOneArgument) {
+  const Value node = elementFrom("<a/>");
+  EXPECT_EQ(refusedCounts(fn_namespace_uri, node, 5, node), "2 3 4 5");
+}
+
+// --- node-name and nilled ------------------------------------------------------------------------
+
+TEST(NodeName, IsTheQNameOfAnElementOrAnAttribute) {
+  const Value tree = document("<p:a xmlns:p='urn:p' p:b='1' c='2'/>");
+  EXPECT_EQ(answer("for $n in (*, */@*) let $q := node-name($n) return "
+                   "(local-name-from-QName($q), namespace-uri-from-QName($q))",
+                   tree),
+            "string a, anyURI urn:p, string b, anyURI urn:p, string c, anyURI ");
+}
+
+TEST(NodeName, HasNoPrefix) {
+  EXPECT_EQ(call(fn_node_name, {elementFrom("<p:a xmlns:p='urn:p'/>")}), "QName a");
+}
+
+TEST(NodeName, OfAnythingElseIsEmpty) {
+  const Value tree = document("<a>t<?pi x?><!--c--></a>");
+  EXPECT_EQ(answer("count((node-name(/), for $n in a/node() return node-name($n)))", tree),
+            "integer 0");
+  for (const Value& argument :
+       {empty(), integer(1), string("a"), sequence({elementFrom("<a/>"), elementFrom("<b/>")})}) {
+    EXPECT_EQ(call(fn_node_name, {argument}), "()");
+  }
+}
+
+TEST(NodeName, WithoutArgumentsIsEmptyWhateverTheContextItem) {
+  EXPECT_EQ(call(fn_node_name, {}, elementFrom("<a/>")), "()");
+  EXPECT_EQ(call(fn_node_name, {}), "()");
+}
+
+TEST(NodeName, TakesUpToOneArgument) {
+  EXPECT_EQ(refusedCounts(fn_node_name, elementFrom("<a/>")), "2 3 4 5");
+}
+
+TEST(Nilled, OfAnElementIsFalse) {
+  EXPECT_EQ(call(fn_nilled, {elementFrom("<a/>")}), "false");
+  EXPECT_EQ(call(fn_nilled, {elementFrom("<a xmlns:xsi='http://www.w3.org/2001/XMLSchema-instance' "
+                                         "xsi:nil='true'/>")}),
+            "false");
+}
+
+TEST(Nilled, OfAnythingElseIsEmpty) {
+  for (const Value& argument :
+       {empty(), integer(1), document("<a/>"), sequence({elementFrom("<a/>"), integer(1)})}) {
+    EXPECT_EQ(call(fn_nilled, {argument}), "()");
+  }
+  EXPECT_EQ(answer("count((nilled(a/@b), nilled(a/text())))", document("<a b='1'>t</a>")),
+            "integer 0");
+}
+
+TEST(Nilled, TakesOneArgument) {
+  EXPECT_EQ(refusedCounts(fn_nilled, elementFrom("<a/>"), 5, elementFrom("<a/>")), "0 2 3 4 5");
+}
+
+// --- lang ----------------------------------------------------------------------------------------
+
+struct LanguageRow {
+  const char* requested;
+  const char* written;
+  bool isFound;
+};
+
+TEST(Lang, ComparesPrimaryLanguagesIgnoringCase) {
+  constexpr LanguageRow rows[] = {
+      {"en", "en", true},   {"en", "en-GB", true}, {"en-US", "en-GB", true}, {"en-US", "en", true},
+      {"EN", "en", true},   {"en", "EN-gb", true}, {"en", "de", false},      {"e", "en", false},
+      {"en", "eng", false}, {"", "", true},        {"", "en", false},        {"", "-x", true},
+      {"en", "", false},    {"en ", "en", false},  {"i-x", "i-y", true},
+  };
+  for (const LanguageRow& row : rows) {
+    const Value node = elementFrom(std::string("<a xml:lang='") + row.written + "'/>");
+    EXPECT_EQ(call(fn_lang, {string(row.requested), node}), row.isFound ? "true" : "false")
+        << row.requested << " of " << row.written;
+  }
+}
+
+TEST(Lang, IsThatOfTheNearestElementThatNamesOne) {
+  const Value tree = document("<a xml:lang='en'><b xml:lang='de' c='1'>t<!--x--></b><d/></a>");
+  EXPECT_EQ(answer("lang('de', a/b), lang('de', a/b/@c), lang('de', a/b/text()),"
+                   "lang('en', a/b/text()), lang('en', a/d), lang('en', /)",
+                   tree),
+            "true, true, true, false, true, false");
+}
+
+TEST(Lang, OfANodeWithoutLanguageOrOfNoNodeIsFalse) {
+  EXPECT_EQ(call(fn_lang, {string("en"), elementFrom("<a/>")}), "false");
+  for (const Value& item : {empty(), string("en"), integer(1)}) {
+    EXPECT_EQ(call(fn_lang, {string("en"), item}), "false");
+    EXPECT_EQ(call(fn_lang, {integer(1), item}), "false");
+  }
+}
+
+TEST(Lang, WithoutASecondArgumentIsOfTheContextItem) {
+  EXPECT_EQ(call(fn_lang, {string("en")}, elementFrom("<a xml:lang='en'/>")), "true");
+  EXPECT_EQ(call(fn_lang, {string("en")}, integer(1)), "false");
+  EXPECT_EQ(call(fn_lang, {string("en")}), "false");
+}
+
+TEST(Lang, TheLanguageIsAString) {
+  const Value node = elementFrom("<a xml:lang='en'/>");
+  EXPECT_EQ(call(fn_lang, {untyped("en"), node}), "true");
+  EXPECT_EQ(call(fn_lang, {empty(), node}), "false");
+  EXPECT_EQ(call(fn_lang, {integer(1), node}), "error 6 not a string type - 1");
+}
+
+TEST(Lang, TakesOneOrTwoArguments) {
+  EXPECT_EQ(refusedCounts(fn_lang, string("en")), "0 3 4 5");
+}
+
+// --- id and idref --------------------------------------------------------------------------------
+
+TEST(Id, FindsNothingFromAnyNode) {
+  const Value node = elementFrom("<a xml:id='x' id='y'><b idref='x'/></a>");
+  for (const auto procedure : {fn_id, fn_idref}) {
+    for (const auto* words : {"x", "", "  x \t y ", "z"}) {
+      EXPECT_EQ(call(procedure, {string(words)}, node), "()") << words;
+    }
+    EXPECT_EQ(call(procedure, {empty()}, node), "()");
+  }
+}
+
+TEST(Id, WithoutAContextNodeIsRefused) {
+  for (const auto procedure : {fn_id, fn_idref}) {
+    EXPECT_EQ(call(procedure, {string("x")}), "null");
+    EXPECT_EQ(call(procedure, {string("x")}, integer(1)), "null");
+    EXPECT_EQ(call(procedure, {integer(1)}), "null");
+  }
+}
+
+TEST(Id, TakesOneString) {
+  const Value node = elementFrom("<a/>");
+  for (const auto procedure : {fn_id, fn_idref}) {
+    EXPECT_EQ(call(procedure, {integer(1)}, node), "error 6 not a string type - 1");
+    EXPECT_EQ(call(procedure, {sequence({string("x"), string("y")})}, node),
+              "error 6 not a string type - (x, y)");
+    EXPECT_EQ(refusedCounts(procedure, string("x"), 5, node), "0 2 3 4 5");
+  }
+}
+
 // --- root ----------------------------------------------------------------------------------------
 
 TEST(Root, IsTheTopmostAncestor) {
