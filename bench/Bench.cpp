@@ -66,6 +66,25 @@ constexpr Row rows[] = {
     {"arithmetic", "(1 to 1000000)[. * 2 + 1 > 1999000]", false},
 };
 
+// Queries that do one thing many times, measured by the time that it takes once.
+struct StepRow {
+  const char* name;
+  const char* query;
+  double steps;
+};
+
+constexpr StepRow stepRows[] = {
+    {"arithmetic in FLWOR", "for $x in 1 to 1000000 return $x * 2 + 1", 2e6},
+    {"call with two arguments",
+     "declare function local:sum($a, $b) { $a + $b }; for $x in 1 to 1000000 return local:sum($x, "
+     "1)",
+     1e6},
+    {"quantified binding", "every $x in 1 to 1000000 satisfies $x > 0", 1e6},
+    {"sorted integer", "for $x in 1 to 1000000 order by ($x * 7919) mod 1000003 return $x", 1e6},
+    {"sorted string", "for $x in 1 to 1000000 order by string(($x * 7919) mod 1000003) return $x",
+     1e6},
+};
+
 double residentBytes() {
   malloc_trim(0);
   long total = 0, resident = 0;
@@ -114,8 +133,7 @@ void walkTree(benchmark::State& state) {
   state.SetItemsProcessed(state.iterations() * static_cast<int64_t>(inputs.nodes));
 }
 
-void compileQuery(benchmark::State& state) {
-  const std::string text = "//book[price > 10]/title";
+void compileQuery(benchmark::State& state, const std::string& text) {
   for (auto _ : state) benchmark::DoNotOptimize(bench::compile(text).get());
 }
 
@@ -146,6 +164,15 @@ void runPeer(benchmark::State& state, const Row& row) {
   setCounters(state, row, selected);
 }
 
+void runSteps(benchmark::State& state, const StepRow& row) {
+  const auto query = bench::compile(row.query);
+  const auto context = XQueryContext::xqueryContext();
+  for (auto _ : state) bench::evaluate(*context, *query, {});
+  using Counter = benchmark::Counter;
+  state.counters["s/step"] =
+      Counter(row.steps, Counter::kIsIterationInvariantRate | Counter::kInvert);
+}
+
 // One of the queries in bench/queries, by the name of its file.
 void runAuctionQuery(benchmark::State& state, const std::string& text) {
   const auto query = bench::compile(text);
@@ -171,7 +198,10 @@ void registerAll() {
   add("tree/build", buildTree);
   add("tree/build peer", buildPeerTree);
   add("tree/walk", walkTree);
-  add("compile/one line", compileQuery);
+  add("compile/one line", compileQuery, "//book[price > 10]/title");
+  add("compile/one line of FLWOR", compileQuery,
+      "for $b at $i in //book where $b/price > 10 order by $b/title return <t n='{$i}'/>");
+  for (const StepRow& row : stepRows) add(std::string("step/") + row.name, runSteps, row);
   for (const Row& row : rows) {
     const std::string name = std::string(row.family) + " " + row.query;
     add(name, runEngine, row);
