@@ -1,11 +1,13 @@
 // xquery_bench [--factor=F] [--scaling] [Google Benchmark options]
 //
-// Measures the tree build, a table of paths, each beside the peer's figure from the same run, and
-// the queries of bench/queries over auction data. The factor may also come from
+// Measures the tree build, single steps (some with the memory that each takes at the peak), a table
+// of paths, each beside the peer's figure from the same run, and the queries of bench/queries over
+// auction data. The factor may also come from
 // XQUERY_BENCH_FACTOR; 0.1 (about 11 MB) is the default. Before a path is measured, both sides must
 // agree on the number of nodes it selects.
 #include "AuctionData.h"
 #include "Engine.h"
+#include "PeakMemory.h"
 #include "Peer.h"
 #include "Scaling.h"
 
@@ -64,6 +66,18 @@ constexpr Row rows[] = {
     {"arithmetic", "//bidder[increase * 2 + 1 > 20]"},
     {"arithmetic", "//open_auction[current - initial > 10]/seller"},
     {"arithmetic", "(1 to 1000000)[. * 2 + 1 > 1999000]", false},
+    {"join", "for $a in 1 to 2000, $b in 1 to 2000 where $a eq $b return $a", false},
+    {"join",
+     "for $p in //person, $a in //closed_auction where $a/buyer/@person = $p/@id return $a/price",
+     false},
+    {"join",
+     "for $p in (//person)[position() <= 100] return count(//closed_auction[buyer/@person = "
+     "$p/@id])",
+     false},
+    {"join",
+     "for $p in //person let $a := for $t in //closed_auction where $t/seller/@person = $p/@id "
+     "return $t where count($a) > 1 return $p/name",
+     false},
 };
 
 // Queries that do one thing many times, measured by the time that it takes once.
@@ -71,6 +85,7 @@ struct StepRow {
   const char* name;
   const char* query;
   double steps;
+  bool memory = false;  // measured as well
 };
 
 constexpr StepRow stepRows[] = {
@@ -83,6 +98,11 @@ constexpr StepRow stepRows[] = {
     {"sorted integer", "for $x in 1 to 1000000 order by ($x * 7919) mod 1000003 return $x", 1e6},
     {"sorted string", "for $x in 1 to 1000000 order by string(($x * 7919) mod 1000003) return $x",
      1e6},
+    {"constructed element", "for $x in 1 to 1000000 return <e>{$x}</e>", 1e6, true},
+    {"constructed element with attributes",
+     "for $x in 1 to 1000000 return <e n='{$x}' m='1'><f/></e>", 1e6, true},
+    {"counted item", "count(for $x in 1 to 10000000 return $x)", 1e7, true},
+    {"item", "for $x in 1 to 10000000 return $x", 1e7, true},
 };
 
 double residentBytes() {
@@ -171,6 +191,7 @@ void runSteps(benchmark::State& state, const StepRow& row) {
   using Counter = benchmark::Counter;
   state.counters["s/step"] =
       Counter(row.steps, Counter::kIsIterationInvariantRate | Counter::kInvert);
+  if (row.memory) state.counters["peak bytes/step"] = bench::peakBytesOf(row.query) / row.steps;
 }
 
 // One of the queries in bench/queries, by the name of its file.
@@ -234,6 +255,7 @@ std::optional<double> takeFactor(int& argc, char** argv, bool& scaling) {
 }  // namespace
 
 int main(int argc, char** argv) {
+  if (argc == 3 && std::strcmp(argv[1], "--peak") == 0) return bench::reportPeak(argv[2]);
   bool scaling = false;
   const std::optional<double> factor = takeFactor(argc, argv, scaling);
   if (!factor) {
