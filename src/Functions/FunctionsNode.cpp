@@ -2,6 +2,7 @@
 
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
+#include "Functions/XQueryTextArgument.h"
 #include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
@@ -14,13 +15,6 @@
 
 namespace xquery {
 namespace {
-
-// The only argument, or the context item without one. Null when there is neither, and for more
-// arguments than one.
-Value argumentOrContextItem(const Value* arguments, size_t count, XQueryContext& context) {
-  if (count > 1) return Value();
-  return count == 1 ? arguments[0] : context._internal().contextItem();
-}
 
 Value asString(Ref<NSString> text, XQueryContext& context) {
   return XQueryCastAsTypeForContext(text ? text : NSString::empty(), XQueryTypeString, context);
@@ -93,7 +87,7 @@ Value nodesForTokens(const Value* arguments, size_t count, Resolve resolve,
 }  // namespace
 
 Value fn_string(const Value* arguments, size_t count, XQueryContext& context) {
-  const Value item = argumentOrContextItem(arguments, count, context);
+  const Value item = XQueryArgumentOrContextItem(arguments, count, context);
   if (!item) return Value();
   if (isNull(item)) return asString(NSString::empty(), context);
   if (const auto* node = dyn_cast<NSXMLNode>(item.get())) {
@@ -112,7 +106,7 @@ Value fn_data(const Value* arguments, size_t count, XQueryContext&) {
 }
 
 Value fn_number(const Value* arguments, size_t count, XQueryContext& context) {
-  const Value argument = argumentOrContextItem(arguments, count, context);
+  const Value argument = XQueryArgumentOrContextItem(arguments, count, context);
   if (!argument) return Value();
   const Value item =
       XQueryAtomizationCheckingOccurrence(argument, XQueryOccurrenceAnyAlso, context);
@@ -135,17 +129,18 @@ Value XQueryDoubleOrNaN(const Value& item, XQueryContext& context) {
 }
 
 Value fn_name(const Value* arguments, size_t count, XQueryContext& context) {
-  return nameAsString(argumentOrContextItem(arguments, count, context), XQueryNodeName, context);
+  return nameAsString(XQueryArgumentOrContextItem(arguments, count, context), XQueryNodeName,
+                      context);
 }
 
 Value fn_local_name(const Value* arguments, size_t count, XQueryContext& context) {
   return nameAsString(
-      argumentOrContextItem(arguments, count, context),
+      XQueryArgumentOrContextItem(arguments, count, context),
       [](const NSXMLNode* node) { return node->localName(); }, context);
 }
 
 Value fn_namespace_uri(const Value* arguments, size_t count, XQueryContext& context) {
-  const Value item = argumentOrContextItem(arguments, count, context);
+  const Value item = XQueryArgumentOrContextItem(arguments, count, context);
   Ref<NSString> URI;
   if (!isNull(item)) {
     const auto* node = dyn_cast<NSXMLNode>(item.get());
@@ -193,7 +188,7 @@ Value fn_idref(const Value* arguments, size_t count, XQueryContext& context) {
 
 // The topmost ancestor, or the node itself.
 Value fn_root(const Value* arguments, size_t count, XQueryContext& context) {
-  const Value item = argumentOrContextItem(arguments, count, context);
+  const Value item = XQueryArgumentOrContextItem(arguments, count, context);
   if (!item || isNull(item)) return item;
   const auto* node = dyn_cast<NSXMLNode>(item.get());
   return node ? Value(XQueryNodeRoot(node)) : Value();

@@ -1,25 +1,102 @@
 #include "Functions/FunctionsString.h"
 
+#include "Expr/XQuerySequence.h"
+#include "Functions/XQueryTextArgument.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
-#include "xquery/Collection.h"
-#include "xquery/String.h"
+#include "Types/XQueryNumber.h"
+#include "Types/XQueryString.h"
+
+#include <new>
+#include <optional>
+#include <string>
 
 namespace xquery {
+namespace {
+
+// The text of one argument of `concat`; null for the empty sequence. Any atomic value has one, a
+// string's being the string itself.
+Value textToConcat(const Value& argument, XQueryContext& context) {
+  Value item = XQueryAtomizationCheckingOccurrence(argument, XQueryOccurrenceAnyAlso, context);
+  if (isNull(item) || isa<NSString>(item)) return item;
+  return XQueryCastAsTypeForContext(item, XQueryTypeString, context);
+}
+
+// The length of the joined strings where all of them and the separator are 8-bit.
+std::optional<size_t> narrowJoinedLength(const NSArray& items, NSStringView separator) {
+  if (separator.isWide() || items.count() == 0) return std::nullopt;
+  size_t length = (items.count() - 1) * size_t{separator.length()};
+  for (const Value& item : items.objects()) {
+    const auto* string = dyn_cast<NSString>(item);
+    if (!string || string->view().isWide()) return std::nullopt;
+    length += string->length();
+  }
+  return length;
+}
+
+Value joined(const NSArray& items, NSStringView separator, XQueryContext& context) {
+  NSMutableString text;
+  for (size_t index = 0; index < items.count(); ++index) {
+    if (index > 0) text.append(separator);
+    text.append(XQueryTextArgument(items.objects()[index], context).view());
+  }
+  return XQueryString::stringWithView(text.view());
+}
+
+// The same for strings that are 8-bit all of them, whose length is known beforehand.
+Value joinedNarrow(const NSArray& items, NSStringView separator, size_t length) {
+  if (length >= NSStringView::notFound) throw std::bad_alloc();
+  std::string text;
+  text.reserve(length);
+  for (size_t index = 0; index < items.count(); ++index) {
+    if (index > 0) text.append(separator.asciiUnits(), separator.length());
+    const NSStringView piece = cast<NSString>(items.objects()[index])->view();
+    text.append(piece.asciiUnits(), piece.length());
+  }
+  return XQueryString::stringWithView(NSStringView::ascii(text));
+}
+
+}  // namespace
+
+Value fn_compare(const Value* arguments, size_t count, XQueryContext& context) {
+  if (count < 2 || count > 3) return Value();
+  if (count == 3) XQueryTextArgument(arguments[2], context);
+  for (size_t index = 0; index < 2; ++index) {
+    if (XQueryItemList(arguments[index].get()).count() == 0) return NSNull::null();
+  }
+  const XQueryTextArgument a(arguments[0], context);
+  const XQueryTextArgument b(arguments[1], context);
+  return XQueryNumber::integerWithInt64(a.view().compare(b.view()));
+}
 
 // The answer is a plain string, which is an untyped value.
 Value fn_concat(const Value* arguments, size_t count, XQueryContext& context) {
   if (count < 2) return Value();
   NSMutableString text;
   for (size_t index = 0; index < count; ++index) {
-    Value item =
-        XQueryAtomizationCheckingOccurrence(arguments[index], XQueryOccurrenceAnyAlso, context);
-    if (isa<NSNull>(item)) continue;
-    item = XQueryCastAsTypeForContext(item, XQueryTypeString, context);
+    const Value item = textToConcat(arguments[index], context);
+    if (isNull(item)) continue;
     if (!isa<NSString>(item)) return item;
     text.append(cast<NSString>(item)->view());
   }
   return text.string();
+}
+
+Value fn_string_join(const Value* arguments, size_t count, XQueryContext& context) {
+  if (count != 2) return Value();
+  const XQueryTextArgument separator(arguments[1], context);
+  if (const auto* items = dyn_cast<NSArray>(arguments[0])) {
+    const auto length = narrowJoinedLength(*items, separator.view());
+    return length ? joinedNarrow(*items, separator.view(), *length)
+                  : joined(*items, separator.view(), context);
+  }
+  return XQueryPromoteToString(arguments[0], context);
+}
+
+Value fn_string_length(const Value* arguments, size_t count, XQueryContext& context) {
+  const Value item = XQueryArgumentOrContextItem(arguments, count, context);
+  if (!item) return Value();
+  return XQueryNumber::integerWithInt64(XQueryTextArgument(item, context).view().length());
 }
 
 }  // namespace xquery

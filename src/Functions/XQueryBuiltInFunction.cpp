@@ -2,6 +2,7 @@
 
 #include "Functions/FunctionsAggregate.h"
 #include "Functions/FunctionsBoolean.h"
+#include "Functions/FunctionsCodepoints.h"
 #include "Functions/FunctionsConstructors.h"
 #include "Functions/FunctionsContext.h"
 #include "Functions/FunctionsError.h"
@@ -9,6 +10,8 @@
 #include "Functions/FunctionsQName.h"
 #include "Functions/FunctionsSequence.h"
 #include "Functions/FunctionsString.h"
+#include "Functions/FunctionsStringMapping.h"
+#include "Functions/FunctionsSubstring.h"
 #include "Functions/FunctionsURI.h"
 
 #include <array>
@@ -34,24 +37,24 @@ constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
     {FN, "document-uri", fn_document_uri},
     {FN, "error", fn_error},
     {FN, "trace", fn_trace},
-    {FN, "codepoints-to-string", nullptr},
-    {FN, "string-to-codepoints", nullptr},
-    {FN, "compare", nullptr},
+    {FN, "codepoints-to-string", fn_codepoints_to_string},
+    {FN, "string-to-codepoints", fn_string_to_codepoints},
+    {FN, "compare", fn_compare},
     {FN, "concat", fn_concat},
-    {FN, "string-join", nullptr},
-    {FN, "starts-with", nullptr},
-    {FN, "ends-with", nullptr},
-    {FN, "contains", nullptr},
-    {FN, "substring", nullptr},
-    {FN, "string-length", nullptr},
-    {FN, "substring-before", nullptr},
-    {FN, "substring-after", nullptr},
-    {FN, "normalize-space", nullptr},
-    {FN, "normalize-unicode", nullptr},
-    {FN, "upper-case", nullptr},
-    {FN, "lower-case", nullptr},
-    {FN, "translate", nullptr},
-    {FN, "escape-uri", nullptr},
+    {FN, "string-join", fn_string_join},
+    {FN, "starts-with", fn_starts_with},
+    {FN, "ends-with", fn_ends_with},
+    {FN, "contains", fn_contains},
+    {FN, "substring", fn_substring},
+    {FN, "string-length", fn_string_length},
+    {FN, "substring-before", fn_substring_before},
+    {FN, "substring-after", fn_substring_after},
+    {FN, "normalize-space", fn_normalize_space},
+    {FN, "normalize-unicode", fn_normalize_unicode},
+    {FN, "upper-case", fn_upper_case},
+    {FN, "lower-case", fn_lower_case},
+    {FN, "translate", fn_translate},
+    {FN, "escape-uri", fn_escape_uri},
     {FN, "matches", nullptr},
     {FN, "replace", nullptr},
     {FN, "tokenize", nullptr},

@@ -159,6 +159,8 @@ inline constexpr XQueryErrorText<> notOneOrMore{
     6, "fn:one-or-more called with a sequence containing zero items"};
 inline constexpr XQueryErrorText<> notExactlyOne{
     6, "fn:exactly-one called with a sequence containing zero or more than one item"};
+inline constexpr XQueryErrorText<> unsupportedNormalizationForm{
+    0, "err:FOCH0003 - unsupported normalization form"};
 
 }  // namespace XQueryErrors
 }  // namespace xquery

@@ -1,0 +1,145 @@
+#include "Functions/FunctionsSubstring.h"
+
+#include "Expr/XQueryArithmetic.h"
+#include "Functions/XQueryTextArgument.h"
+#include "Types/XQueryNumber.h"
+#include "Types/XQueryString.h"
+
+#include <algorithm>
+#include <cmath>
+#include <optional>
+
+namespace xquery {
+namespace {
+
+// Two strings and a collation that has no effect.
+template <class Function>
+Value withTwoTexts(const Value* arguments, size_t count, XQueryContext& context,
+                   Function function) {
+  if (count < 2 || count > 3) return Value();
+  const XQueryTextArgument text(arguments[0], context);
+  const XQueryTextArgument part(arguments[1], context);
+  if (count == 3) XQueryTextArgument(arguments[2], context);
+  return function(text.view(), part.view());
+}
+
+Value truth(bool value) {
+  return NSNumber::numberWithBool(value);
+}
+
+// --- substring -----------------------------------------------------------------------------------
+
+// Far from any length of a string, and two of them add up within 64 bits.
+constexpr int64_t farAway = int64_t{1} << 62;
+
+// The number rounded to a whole one, halves up; nothing for NaN.
+std::optional<int64_t> roundedPosition(const NSNumber& number) {
+  if (XQueryIsNaN(number)) return std::nullopt;
+  switch (number.storage()) {
+    case NSNumber::Storage::Double:
+    case NSNumber::Storage::Float: {
+      const double value = number.doubleValue();
+      const double below = std::floor(value);
+      const double rounded = value - below >= 0.5 ? below + 1 : below;
+      constexpr auto limit = static_cast<double>(farAway);
+      return static_cast<int64_t>(std::clamp(rounded, -limit, limit));
+    }
+    case NSNumber::Storage::Decimal:
+      return std::clamp(number.decimalValue().rounded(0, NSRoundingMode::HalfUp).int64Value(),
+                        -farAway, farAway);
+    default:
+      return std::clamp(number.longLongValue(), -farAway, farAway);
+  }
+}
+
+// The units that a start and a length pick out of a text. Without a length it is as if that were
+// infinite.
+struct UnitRange {
+  uint32_t from = 0;
+  uint32_t count = 0;
+};
+
+UnitRange rangeOfSubstring(uint32_t textLength, int64_t start, std::optional<int64_t> length) {
+  const int64_t end = textLength;
+  int64_t from = start - 1;
+  if (from >= end) return {};
+  if (!length) {
+    from = std::max<int64_t>(from, 0);
+    return {static_cast<uint32_t>(from), static_cast<uint32_t>(end - from)};
+  }
+  if (*length <= 0 || from + *length < 1) return {};
+  int64_t count = std::min(*length, end - from);
+  if (from < 0) {
+    count += from;
+    from = 0;
+  }
+  return {static_cast<uint32_t>(from), static_cast<uint32_t>(count)};
+}
+
+bool isInfinite(const NSNumber& number) {
+  return std::isinf(number.doubleValue());
+}
+
+}  // namespace
+
+Value fn_contains(const Value* arguments, size_t count, XQueryContext& context) {
+  return withTwoTexts(arguments, count, context, [](NSStringView text, NSStringView part) {
+    return truth(text.find(part) != NSStringView::notFound);
+  });
+}
+
+Value fn_starts_with(const Value* arguments, size_t count, XQueryContext& context) {
+  return withTwoTexts(arguments, count, context, [](NSStringView text, NSStringView part) {
+    return truth(text.startsWith(part));
+  });
+}
+
+Value fn_ends_with(const Value* arguments, size_t count, XQueryContext& context) {
+  return withTwoTexts(arguments, count, context, [](NSStringView text, NSStringView part) {
+    return truth(text.endsWith(part));
+  });
+}
+
+Value fn_substring(const Value* arguments, size_t count, XQueryContext& context) {
+  if (count < 2 || count > 3) return Value();
+  const Value source = XQueryPromoteToString(arguments[0], context);
+  const Value start = XQueryPromoteToNumeric(arguments[1], context);
+  const Value length = count == 3 ? XQueryPromoteToNumeric(arguments[2], context) : Value();
+  const NSStringView text = cast<NSString>(source)->view();
+  // An empty start or length selects nothing, as a NaN does.
+  const auto* startNumber = dyn_cast<NSNumber>(start);
+  const std::optional<int64_t> from =
+      startNumber ? roundedPosition(*startNumber) : std::optional<int64_t>();
+  if (!from) return XQueryString::stringWithView({});
+  std::optional<int64_t> units;
+  if (count == 3) {
+    const auto* lengthNumber = dyn_cast<NSNumber>(length);
+    units = lengthNumber ? roundedPosition(*lengthNumber) : std::optional<int64_t>();
+    if (!units) return XQueryString::stringWithView({});
+    if (*units > 0 && isInfinite(*lengthNumber)) units.reset();
+  }
+  // From minus infinity nothing can be reached, however long the part is.
+  if (*from < 0 && isInfinite(*startNumber)) return XQueryString::stringWithView({});
+  const UnitRange range = rangeOfSubstring(text.length(), *from, units);
+  if (range.count == text.length()) return source;
+  return XQueryString::stringWithView(text.substring(range.from, range.count));
+}
+
+Value fn_substring_before(const Value* arguments, size_t count, XQueryContext& context) {
+  return withTwoTexts(arguments, count, context, [](NSStringView text, NSStringView part) {
+    const uint32_t found = text.find(part);
+    if (found == NSStringView::notFound) return Value(XQueryString::stringWithView({}));
+    return Value(XQueryString::stringWithView(text.substring(0, found)));
+  });
+}
+
+Value fn_substring_after(const Value* arguments, size_t count, XQueryContext& context) {
+  return withTwoTexts(arguments, count, context, [&](NSStringView text, NSStringView part) {
+    if (part.isEmpty()) return XQueryPromoteToString(arguments[0], context);
+    const uint32_t found = text.find(part);
+    if (found == NSStringView::notFound) return Value(XQueryString::stringWithView({}));
+    return Value(XQueryString::stringWithView(text.substring(found + part.length())));
+  });
+}
+
+}  // namespace xquery
