@@ -3,6 +3,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryTextArgument.h"
+#include "Platform/ICUText.h"
 #include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
@@ -53,12 +54,8 @@ bool isNoNumber(NSStringView text) {
   return !scanDouble(text, ignored) && text != "NaN" && text != "INF" && text != "-INF";
 }
 
-std::string primaryLanguage(const NSString& language) {
-  std::string primary = language.view().substring(0, language.view().find(u'-')).utf8();
-  for (char& unit : primary) {
-    if (unit >= 'A' && unit <= 'Z') unit = static_cast<char>(unit - 'A' + 'a');
-  }
-  return primary;
+std::u16string primaryLanguage(NSStringView language) {
+  return lowerCasedText(language.substring(0, language.find(u'-')).utf16());
 }
 
 // What `resolve` finds from the context node for each word of the only argument, in the order of
@@ -174,8 +171,8 @@ Value fn_lang(const Value* arguments, size_t count, XQueryContext& context) {
   const Value requested = XQueryPromoteToString(arguments[0], context);
   const Ref<NSString> language = XQueryNodeLanguage(node);
   if (!language) return NSNumber::falseValue();
-  return NSNumber::numberWithBool(primaryLanguage(*cast<NSString>(requested.get())) ==
-                                  primaryLanguage(*language));
+  return NSNumber::numberWithBool(primaryLanguage(cast<NSString>(requested.get())->view()) ==
+                                  primaryLanguage(language->view()));
 }
 
 Value fn_id(const Value* arguments, size_t count, XQueryContext& context) {
