@@ -162,5 +162,63 @@ TEST_F(ModuleImport, WhatAModuleImportsIsNotHandedOn) {
   EXPECT_EQ(failure(), "");
 }
 
+// Each module imports the one after it; values and calls go all the way.
+TEST_F(ModuleImport, AChainOfAThousandModules) {
+  constexpr int count = 1000;
+  for (int i = 0; i < count; ++i) {
+    const std::string next = std::to_string(i + 1);
+    const bool isLast = i + 1 == count;
+    module(std::to_string(i) + ".xq",
+           "module namespace m = 'urn:" + std::to_string(i) + "';" +
+               (isLast ? ""
+                       : " import module namespace n = 'urn:" + next + "' at " +
+                             location(next + ".xq") + ";") +
+               " declare variable $m:v := " + (isLast ? "1" : "$n:v + 1") +
+               "; declare function m:f($i) { " + (isLast ? "$i" : "n:f($i + 1)") + " };");
+  }
+  const std::string import = "import module namespace m = 'urn:0' at " + location("0.xq") + "; ";
+  EXPECT_EQ(strings(evaluate(import + "m:f(0), $m:v")), "999 1000");
+  EXPECT_EQ(failure(), "");
+}
+
+// What was wrong with a rejected module is forgotten, but the module stays registered under its
+// namespace: who asks for that next gets its declarations, the wrong ones among them.
+TEST_F(ModuleImport, DeclarationsOfARejectedModuleAreEvaluatedLikeOthers) {
+  module("b.xq",
+         "module namespace b = 'urn:b'; declare variable $b:ok := 1; declare function b:path() { "
+         "/zz:e }; declare function b:element() { <zz:e/> }; declare function b:attribute() { <e "
+         "zz:a='1'/> }; declare function b:type() { 1 cast as zz:t };");
+  const std::string import = "import module namespace b = 'urn:b' at " + location("b.xq") + "; ";
+  EXPECT_EQ(numbers(import + "1"), std::vector<int64_t>{47});
+  module("x1.xq", "module namespace x = 'urn:x'; " + import + "declare function x:f() { 1 };");
+  const std::pair<std::string, std::string> calls[] = {
+      {"path", "1"},
+      {"element", "6 invalid type"},
+      {"attribute", "6 invalid type"},
+      {"type", "6 value does not match a required type"}};
+  for (const auto& [function, expected] : calls) {
+    module("x2.xq", "module namespace x = 'urn:x'; " + import +
+                        "declare function x:f() { $b:ok, b:" + function + "() };");
+    const std::string source = "import module namespace x = 'urn:x' at " + location("x1.xq") +
+                               ", " + location("x2.xq") + "; x:f()";
+    EXPECT_EQ(numbers(source), std::vector<int64_t>()) << function;
+    const auto items = evaluate(source, {}, parse("<r/>"));
+    EXPECT_EQ(items ? strings(items) : failure(), expected) << function;
+  }
+}
+
+// The query and its context serve on.
+TEST_F(ModuleImport, AQueryWithARejectedModuleFailsEachTimeAlike) {
+  const auto bad =
+      module("m.xq", "module namespace m = 'urn:m'; declare function m:f() { /zz:e };");
+  const auto query = XQuery::xqueryWithSource(
+      std::string_view("import module namespace m = 'urn:m' at " + bad + "; m:f()"));
+  for (int i = 0; i < 2; ++i) {
+    EXPECT_FALSE(context->evaluateXQuery(*query, {}, nullptr, &error));
+    EXPECT_EQ(failure().substr(0, 24), "47 can't access module f");
+  }
+  EXPECT_EQ(strings(evaluate("1 + 1")), "2");
+}
+
 }  // namespace
 }  // namespace xquery

@@ -7,6 +7,8 @@
 //   <a><b/></a>
 //   -- file NAME                    (optional, repeatable: a file to load; "@folder@" stands in the
 //   <c/>                             query and its result for the URL of its folder)
+//   -- module URI                   (optional, repeatable: what there is at that location when the
+//   module namespace m = "urn:m";    query is compiled; nowhere else is looked then)
 //   -- query
 //   //b
 //   -- result                       (one line per item: type, tab, text as the command prints it)
@@ -23,6 +25,8 @@
 #include <filesystem>
 #include <fstream>
 #include <map>
+#include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -38,6 +42,7 @@ struct Case {
   std::map<std::string, std::string> namespaces;
   std::string xml;
   std::map<std::string, std::string> files;
+  std::map<std::string, std::string> modules;
   std::string query;
   std::vector<std::string> result;
   std::string error;  // empty when a result is expected
@@ -51,12 +56,12 @@ std::string takeUpTo(std::string& text, char separator) {
   return head;
 }
 
-void readHeader(Case& c, std::string header, std::string& section, std::string& fileName) {
+void readHeader(Case& c, std::string header, std::string& section, std::string& name) {
   section = takeUpTo(header, ' ');
-  fileName = header;
+  name = header;
   if (section == "var") {
-    const std::string name = takeUpTo(header, '=');
-    c.constants[name] = XQueryUntypedAtomic(header);
+    const std::string variable = takeUpTo(header, '=');
+    c.constants[variable] = XQueryUntypedAtomic(header);
   } else if (section == "namespace") {
     const std::string prefix = takeUpTo(header, '=');
     c.namespaces[prefix] = header;
@@ -68,7 +73,7 @@ void readHeader(Case& c, std::string header, std::string& section, std::string& 
 std::vector<Case> readCases(const std::filesystem::path& path) {
   std::ifstream in(path);
   std::vector<Case> cases;
-  std::string line, section, fileName;
+  std::string line, section, sectionName;
   for (int number = 1; std::getline(in, line); ++number) {
     if (line.rfind("== ", 0) == 0) {
       cases.emplace_back();
@@ -77,11 +82,13 @@ std::vector<Case> readCases(const std::filesystem::path& path) {
       cases.back().line = number;
       section.clear();
     } else if (line.rfind("-- ", 0) == 0) {
-      readHeader(cases.back(), line.substr(3), section, fileName);
+      readHeader(cases.back(), line.substr(3), section, sectionName);
     } else if (section == "xml") {
       cases.back().xml += line + "\n";
     } else if (section == "file") {
-      cases.back().files[fileName] += line + "\n";
+      cases.back().files[sectionName] += line + "\n";
+    } else if (section == "module") {
+      cases.back().modules[sectionName] += line + "\n";
     } else if (section == "query") {
       cases.back().query += line + "\n";
     } else if (section == "result" && !line.empty()) {
@@ -132,6 +139,31 @@ bool matches(std::string_view text, std::string_view pattern) {
   return text.size() >= pattern.size() && text.substr(text.size() - pattern.size()) == pattern;
 }
 
+// Gives out the modules of a case.
+class ModuleLoader : public XQueryLoader {
+ public:
+  explicit ModuleLoader(std::map<std::string, std::string> modules)
+      : _modules(std::move(modules)) {}
+  std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose) override {
+    const auto found = _modules.find(URL.absoluteString()->utf8());
+    if (found == _modules.end()) return std::nullopt;
+    return XQueryResource{found->second, {}, {}, {}};
+  }
+
+ private:
+  std::map<std::string, std::string> _modules;
+};
+
+XQueryLoading compileLoading(const Case& c) {
+  XQueryLoading loading;
+  if (c.modules.empty()) return loading;
+  loading.loader = std::make_shared<ModuleLoader>(c.modules);
+  // Locations of any scheme that the case thinks up.
+  for (const auto& [URL, text] : c.modules)
+    loading.policy.allowScheme(URL.substr(0, URL.find(':')));
+  return loading;
+}
+
 class QueryCase : public testing::Test {
  public:
   explicit QueryCase(Case c) : _case(std::move(c)) {}
@@ -150,7 +182,8 @@ class QueryCase : public testing::Test {
     }
     // The last line break belongs to the file, not to the query.
     const auto query = XQuery::xqueryWithSource(
-        std::string_view(text).substr(0, text.empty() ? 0 : text.size() - 1));
+        std::string_view(text).substr(0, text.empty() ? 0 : text.size() - 1),
+        compileLoading(_case));
     const auto context = XQueryContext::xqueryContextWithNamespaces(_case.namespaces);
     Ref<XQueryError> error;
     const auto items = context->evaluateXQuery(*query, _case.constants, document, &error);
