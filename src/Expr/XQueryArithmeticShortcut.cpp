@@ -13,13 +13,12 @@
 //                      is xs:double; an untyped operand is cast by scanning its text, and an exact
 //                      one by scanning what it prints.
 #include "Expr/XQueryArithmetic.h"
+#include "Expr/XQueryNumericOperand.h"
 #include "Expr/XQueryOperatorExpr.h"
-#include "Expr/XQueryUntypedText.h"
 #include "Types/XQueryNumber.h"
 
 #include <cmath>
 #include <cstdint>
-#include <limits>
 
 namespace xquery {
 namespace {
@@ -85,9 +84,6 @@ Value exactAnswer(int type, const NSDecimal& a, const NSDecimal& b, bool bothInt
 
 // --- doubles -------------------------------------------------------------------------------------
 
-// Every integer up to this magnitude is a double.
-constexpr int64_t exactIntegerBound = int64_t{1} << std::numeric_limits<double>::digits;
-
 Value doubleAnswer(int type, double a, double b) {
   switch (type) {
     case XQueryOperatorPlus:
@@ -103,7 +99,7 @@ Value doubleAnswer(int type, double a, double b) {
     case XQueryOperatorIDiv: {
       if (b == 0) return Value();
       const double quotient = std::trunc(a / b);
-      if (!(std::fabs(quotient) < static_cast<double>(exactIntegerBound))) return Value();
+      if (!(std::fabs(quotient) < static_cast<double>(XQueryExactIntegerBound))) return Value();
       return XQueryNumber::integerWithInt64(static_cast<int64_t>(quotient));
     }
     default:
@@ -111,57 +107,17 @@ Value doubleAnswer(int type, double a, double b) {
   }
 }
 
-// What an operand is to the shortcut.
-struct Operand {
-  enum Form : uint8_t { Other, Exact, Double };
-  Form form = Other;
-  bool isInteger = false;            // of an exact operand
-  const NSDecimal* exact = nullptr;  // of an exact operand
-  double number = 0;                 // of a double operand
-};
-
-Operand operandOf(const NSObject* object, int type) {
-  Operand operand;
-  if (const auto* number = dyn_cast<XQueryNumber>(object)) {
-    const XQueryTypeID typeID = number->typeID();
-    if (typeID == XQueryTypeDouble) {
-      operand.form = Operand::Double;
-      operand.number = number->doubleValue();
-    } else if (typeID == XQueryTypeInteger || typeID == XQueryTypeDecimal) {
-      operand.exact = number->storedDecimal();
-      operand.isInteger = typeID == XQueryTypeInteger;
-      if (operand.exact && !operand.exact->isNaN()) operand.form = Operand::Exact;
-    }
-    return operand;
-  }
-  // For idiv an untyped operand is an integer, which is not what a scanned double tells.
-  if (type == XQueryOperatorIDiv || !XQueryIsUntyped(object)) return operand;
-  const XQueryUntypedText text(*object);
-  if (scanDouble(text.view(), operand.number)) operand.form = Operand::Double;
-  return operand;
-}
-
-double asDouble(const Operand& operand) {
-  if (operand.form == Operand::Double) return operand.number;
-  const NSDecimal& exact = *operand.exact;
-  if (exact.isSmallInteger() && exact.smallInteger() >= -exactIntegerBound &&
-      exact.smallInteger() <= exactIntegerBound) {
-    return static_cast<double>(exact.smallInteger());
-  }
-  double number = 0;
-  scanDouble(NSStringView::ascii(exact.toString()), number);
-  return number;
-}
-
 }  // namespace
 
 Value XQueryArithmeticShortcut(int type, const NSObject* left, const NSObject* right) {
-  const Operand a = operandOf(left, type);
-  if (a.form == Operand::Other) return Value();
-  const Operand b = operandOf(right, type);
-  if (b.form == Operand::Other) return Value();
-  if (a.form == Operand::Double || b.form == Operand::Double) {
-    return doubleAnswer(type, asDouble(a), asDouble(b));
+  // For idiv an untyped operand is an integer, which is not what a scanned double tells.
+  const bool untypedOnes = type != XQueryOperatorIDiv;
+  const auto a = XQueryNumericOperand::of(left, untypedOnes);
+  if (a.form == XQueryNumericOperand::Other) return Value();
+  const auto b = XQueryNumericOperand::of(right, untypedOnes);
+  if (b.form == XQueryNumericOperand::Other) return Value();
+  if (a.form == XQueryNumericOperand::Double || b.form == XQueryNumericOperand::Double) {
+    return doubleAnswer(type, a.asDouble(), b.asDouble());
   }
   const bool bothIntegers = a.isInteger && b.isInteger;
   if (bothIntegers && a.exact->isSmallInteger() && b.exact->isSmallInteger()) {

@@ -15,6 +15,12 @@ Value fn_count(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_zero_or_one(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_one_or_more(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_exactly_one(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_reverse(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_unordered(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_index_of(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_distinct_values(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_insert_before(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_remove(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_subsequence(const Value* arguments, size_t count, XQueryContext& context);
 
 }  // namespace xquery

@@ -2,11 +2,11 @@
 
 #include "Eval/XQueryContextInternal.h"
 #include "Platform/GregorianCalendar.h"
-#include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryDate.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
+#include "xquery/Collection.h"
 #include "xquery/XQuery.h"
 
 #include <cmath>
@@ -241,6 +241,11 @@ Ref<NSTimeZone> zoneForDuration(const Value& duration) {
   return NSTimeZone::timeZoneForSecondsFromGMT(static_cast<int32_t>(seconds));
 }
 
+bool isEmptySequence(const Value& value) {
+  const auto* array = dyn_cast<NSArray>(value);
+  return isa<NSNull>(value) || (array && array->count() == 0);
+}
+
 // The fields as printed, with a suffix, read again.
 Value readAgain(const XQueryDate& date, const std::string& suffix, XQueryContext& context) {
   const Ref<NSString> fields = date.localizedStringForTimeZone(nullptr);
@@ -252,16 +257,16 @@ Value readAgain(const XQueryDate& date, const std::string& suffix, XQueryContext
 Value adjust_dateTime_to_timezone(const Value* arguments, size_t count, XQueryContext& context,
                                   XQueryTypeID type) {
   if (count != 1 && count != 2) return nullptr;
-  const Value item =
-      XQueryAtomizationCheckingOccurrence(arguments[0], XQueryOccurrenceAnyAlso, context);
-  if (isa<NSNull>(item)) return item;
-  const Value value = XQueryCastAs(item, type, context);
+  if (isEmptySequence(arguments[0])) return NSNull::null();
+  const Value value = XQueryCastAsTypeForContext(arguments[0], type, context);
+  // A cast that fails without raising answers an error record, which travels on.
+  if (!isa<XQueryDate>(value)) return value;
   const XQueryDate& date = dateIn(value);
   Value offset = XQueryNumber::implicitTimeZone();
   if (count == 2) {
-    offset = XQueryAtomizationCheckingOccurrence(arguments[1], XQueryOccurrenceAnyAlso, context);
-    if (isa<NSNull>(offset)) return readAgain(date, "", context);
-    offset = XQueryCastAs(offset, XQueryTypeDayTimeDuration, context);
+    if (isEmptySequence(arguments[1])) return readAgain(date, "", context);
+    offset = XQueryCastAsTypeForContext(arguments[1], XQueryTypeDayTimeDuration, context);
+    if (!isa<NSNumber>(offset)) return offset;
   }
   const Ref<NSTimeZone> zone = zoneForDuration(offset);
   if (!zone) return nullptr;

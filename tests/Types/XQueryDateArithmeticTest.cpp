@@ -4,6 +4,9 @@
 #include "Types/XQueryDate.h"
 #include "Types/XQueryDateArithmetic.h"
 #include "TypesTestSupport.h"
+#include "xquery/Collection.h"
+#include "xquery/Error.h"
+#include "xquery/URL.h"
 
 #include <cmath>
 #include <random>
@@ -490,6 +493,23 @@ TEST_F(AdjustToZone, ArgumentsAreCast) {
   EXPECT_EQ(adjusted(21, {testing::text("x")}), "6 value does not match a required type");
   EXPECT_EQ(adjusted(21, {dateTime("2002-03-07T10:00:00"), integer(1)}),
             "6 value does not match a required type");
+}
+
+TEST_F(AdjustToZone, SeveralValuesAreNotOne) {
+  const Value value = dateTime("2002-03-07T10:00:00");
+  const Value two = NSArray::arrayWithObjects({value, value});
+  EXPECT_EQ(adjusted(21, {two}), "6 invalid type for automization");
+  EXPECT_EQ(adjusted(21, {value, two}), "6 invalid type for automization");
+}
+
+// The error of a cast from a URI is not raised but travels on as the answer.
+TEST_F(AdjustToZone, TheFailedCastOfAURIIsTheAnswer) {
+  const Value uri = NSURL::URLWithString(NSString::stringWithASCII("urn:a"));
+  const auto answer = [&](std::vector<Value> arguments) {
+    return adjust_dateTime_to_timezone(arguments.data(), arguments.size(), *context, 21);
+  };
+  EXPECT_TRUE(isa<XQueryError>(answer({uri})));
+  EXPECT_TRUE(isa<XQueryError>(answer({dateTime("2002-03-07T10:00:00"), uri})));
 }
 
 TEST_F(AdjustToZone, TheOffsetIsNotChecked) {

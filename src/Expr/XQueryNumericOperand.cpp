@@ -1,0 +1,22 @@
+#include "Expr/XQueryNumericOperand.h"
+
+namespace xquery {
+
+XQueryNumericOperand XQueryNumericOperand::ofUntyped(const NSObject& object) {
+  XQueryNumericOperand operand;
+  const XQueryUntypedText text(object);
+  if (scanDouble(text.view(), operand.number)) operand.form = Double;
+  return operand;
+}
+
+double XQueryNumericOperand::asDouble(const NSDecimal& exact) {
+  if (exact.isSmallInteger() && exact.smallInteger() >= -XQueryExactIntegerBound &&
+      exact.smallInteger() <= XQueryExactIntegerBound) {
+    return static_cast<double>(exact.smallInteger());
+  }
+  double number = 0;
+  scanDouble(NSStringView::ascii(exact.toString()), number);
+  return number;
+}
+
+}  // namespace xquery
