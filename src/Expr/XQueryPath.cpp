@@ -23,7 +23,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryAxisWalk.h"
 #include "Expr/XQueryPathRun.h"
-#include "Expr/XQueryRepeatable.h"
+#include "Expr/XQueryReads.h"
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"

@@ -18,6 +18,7 @@
 #include "Functions/FunctionsSubstring.h"
 #include "Functions/FunctionsURI.h"
 
+#include <algorithm>
 #include <array>
 #include <new>
 #include <unordered_map>
@@ -208,6 +209,51 @@ constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
     {EXT, "xpath-for-node", nullptr},
 });
 
+// The functions of the standard namespace that read their arguments only. The constructors of the
+// type namespaces all do. A document is fetched once per context, so doc is one of them.
+constexpr auto readers = std::to_array<std::string_view>({
+    "abs",
+    "boolean",
+    "ceiling",
+    "compare",
+    "concat",
+    "contains",
+    "count",
+    "data",
+    "distinct-values",
+    "doc",
+    "empty",
+    "ends-with",
+    "exists",
+    "floor",
+    "local-name",
+    "lower-case",
+    "max",
+    "min",
+    "name",
+    "namespace-uri",
+    "normalize-space",
+    "not",
+    "number",
+    "round",
+    "starts-with",
+    "string",
+    "string-join",
+    "string-length",
+    "substring",
+    "substring-after",
+    "substring-before",
+    "sum",
+    "translate",
+    "upper-case",
+});
+
+bool readsArgumentsOnly(const XQueryBuiltInFunction::Registration& row) {
+  if (row.namespaceID == XS || row.namespaceID == XDT) return true;
+  return row.namespaceID == FN &&
+         std::find(readers.begin(), readers.end(), row.localName) != readers.end();
+}
+
 Value noAnswer(const Value*, size_t, XQueryContext&) {
   return Value();
 }
@@ -222,9 +268,9 @@ Registry* makeRegistry() {
   registry->reserve(table.size());
   for (const auto& row : table) {
     const Ref<NSString> URI = XQueryModules::builtinNamespaceForID(row.namespaceID);
-    registry->emplace(
-        XQueryQName::qname(NSString::stringWithASCII(row.localName), URI),
-        XQueryBuiltInFunction::builtInFunctionWithProc(row.proc ? row.proc : noAnswer));
+    registry->emplace(XQueryQName::qname(NSString::stringWithASCII(row.localName), URI),
+                      make<XQueryBuiltInFunction>(row.proc ? row.proc : noAnswer,
+                                                  readsArgumentsOnly(row)));
   }
   return registry;
 }
@@ -235,10 +281,15 @@ Ref<XQueryBuiltInFunction> XQueryBuiltInFunction::builtInFunctionWithProc(XQuery
   return make<XQueryBuiltInFunction>(proc);
 }
 
-XQueryProcedure XQueryBuiltInFunction::functionForQName(const Ref<XQueryQName>& qName) {
+const XQueryBuiltInFunction* XQueryBuiltInFunction::entryForQName(const Ref<XQueryQName>& qName) {
   static const Registry* const registry = makeRegistry();
   const auto found = registry->find(qName);
-  return found == registry->end() ? nullptr : found->second->proc();
+  return found == registry->end() ? nullptr : found->second.get();
+}
+
+XQueryProcedure XQueryBuiltInFunction::functionForQName(const Ref<XQueryQName>& qName) {
+  const XQueryBuiltInFunction* entry = entryForQName(qName);
+  return entry ? entry->proc() : nullptr;
 }
 
 std::span<const XQueryBuiltInFunction::Registration> XQueryBuiltInFunction::registrations() {

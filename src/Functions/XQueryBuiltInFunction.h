@@ -28,9 +28,14 @@ class XQueryBuiltInFunction : public NSCounted {
 
   [[nodiscard]] static Ref<XQueryBuiltInFunction> builtInFunctionWithProc(XQueryProcedure proc);
   XQueryProcedure proc() const { return _proc; }
+  // Whether the function answers equal values for the same arguments, fails alike, looks at nothing
+  // else and does nothing else. Holds for calls with at least one argument: without any, some of
+  // these functions take the context item.
+  bool readsArgumentsOnly() const { return _readsArgumentsOnly; }
 
   // Null for a name that is not registered.
   static XQueryProcedure functionForQName(const Ref<XQueryQName>& qName);
+  static const XQueryBuiltInFunction* entryForQName(const Ref<XQueryQName>& qName);
 
   struct Registration {
     XQueryNamespaceID namespaceID;
@@ -41,13 +46,16 @@ class XQueryBuiltInFunction : public NSCounted {
   static std::span<const Registration> registrations();
 
  protected:
-  explicit XQueryBuiltInFunction(XQueryProcedure initWithProc)
-      : NSCounted(Kind::BuiltInFunction), _proc(initWithProc) {}
+  explicit XQueryBuiltInFunction(XQueryProcedure initWithProc, bool readsArgumentsOnly = false)
+      : NSCounted(Kind::BuiltInFunction),
+        _proc(initWithProc),
+        _readsArgumentsOnly(readsArgumentsOnly) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
   XQueryProcedure _proc;
+  bool _readsArgumentsOnly;
 };
 
 }  // namespace xquery

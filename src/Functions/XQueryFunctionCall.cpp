@@ -62,7 +62,10 @@ Ref<XQueryFunctionCall> XQueryFunctionCall::functionCallWithName(Ref<NSString> n
 
 void XQueryFunctionCall::bindInfoForProlog(XQueryProlog& prolog) {
   if (const auto qName = prolog.functionQNameFromString(_name)) {
-    _function = XQueryBuiltInFunction::functionForQName(qName);
+    if (const auto* entry = XQueryBuiltInFunction::entryForQName(qName)) {
+      _function = entry->proc();
+      _readsArgumentsOnly = entry->readsArgumentsOnly() && argumentCount() > 0;
+    }
     if (!_function) _functionDecl = prolog.functionInfoForSignature({qName, argumentCount()});
   }
   if (_args) _args->bindInfoForProlog(prolog);

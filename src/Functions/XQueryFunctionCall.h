@@ -1,15 +1,14 @@
 // A call of a built-in or a declared function.
 #pragma once
 
-#include "Expr/XQueryExpr.h"
-#include "Expr/XQueryLists.h"
+#include "Expr/XQueryCallExpr.h"
 #include "Functions/XQueryBuiltInFunction.h"
 
 namespace xquery {
 
 class XQueryFunctionDecl;
 
-class XQueryFunctionCall : public XQueryExpr {
+class XQueryFunctionCall : public XQueryCallExpr {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::FunctionCall; }
 
@@ -18,7 +17,6 @@ class XQueryFunctionCall : public XQueryExpr {
                                                                     Ref<XQueryArgs> withArgs);
 
   const Ref<NSString>& name() const { return _name; }
-  XQueryArgs* args() const { return _args.get(); }
   // What binding found: a procedure, a declaration (owned by its prolog), or neither.
   XQueryProcedure function() const { return _function; }
   XQueryFunctionDecl* functionDecl() const { return _functionDecl; }
@@ -37,7 +35,7 @@ class XQueryFunctionCall : public XQueryExpr {
 
  protected:
   XQueryFunctionCall(Ref<NSString> name, Ref<XQueryArgs> args)
-      : XQueryExpr(Kind::FunctionCall), _name(std::move(name)), _args(std::move(args)) {}
+      : XQueryCallExpr(std::move(args)), _name(std::move(name)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
@@ -55,7 +53,6 @@ class XQueryFunctionCall : public XQueryExpr {
   [[noreturn, gnu::noinline]] void raiseInvalidArguments(XQueryContext& context) const;
 
   Ref<NSString> _name;
-  Ref<XQueryArgs> _args;
   XQueryProcedure _function = nullptr;
   XQueryFunctionDecl* _functionDecl = nullptr;
 };

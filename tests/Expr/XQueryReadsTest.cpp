@@ -1,5 +1,5 @@
 #include "Expr/XQueryOperatorExpr.h"
-#include "Expr/XQueryRepeatable.h"
+#include "Expr/XQueryReads.h"
 #include "PathTesting.h"
 
 namespace xquery {
