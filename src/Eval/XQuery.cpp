@@ -5,6 +5,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Eval/XQueryGlobals.h"
 #include "Eval/XQueryInternal.h"
+#include "Expr/XQueryJoinMemo.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/NSLog.h"
 #include "Prolog/XQueryProlog.h"
@@ -132,12 +133,14 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   if (compiled.isError()) return shapedResult(query.parseErrors(), error);
 
   context._clearGlobals();
+  context.joinMemo().clear();
   if (contextItem && !isNull(contextItem)) context.setContextItem(contextItem, 1);
   XQueryProlog& prolog = *compiled.prolog();
   context.setOrdered(prolog.ordered());
   context.setActiveProlog(&prolog);
   const Value result = evaluateModule(compiled, constants);
   context._clearGlobals();
+  context.joinMemo().clear();
   return shapedResult(result, error);
 }
 

@@ -1,5 +1,6 @@
 #include "Eval/XQueryContextInternal.h"
 
+#include "Expr/XQueryJoinMemo.h"
 #include "Platform/NSLog.h"
 #include "Platform/XMLTree.h"
 #include "Prolog/XQueryProlog.h"
@@ -26,7 +27,9 @@ uint64_t nextBaseURIOwner() {
 }  // namespace
 
 XQueryContextInternal::XQueryContextInternal()
-    : _baseURIOwner(nextBaseURIOwner()), _loader(NSURLLoader::loaderWithLoading()) {}
+    : _baseURIOwner(nextBaseURIOwner()),
+      _loader(NSURLLoader::loaderWithLoading()),
+      _joinMemo(std::make_unique<XQueryJoinMemo>()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;
 

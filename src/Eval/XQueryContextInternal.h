@@ -19,6 +19,7 @@
 namespace xquery {
 
 class XQueryDate;
+class XQueryJoinMemo;
 class XQueryProlog;
 
 // Whether the error says that a limit of the engine was reached. Such an error ends the evaluation
@@ -117,6 +118,9 @@ class XQueryContextInternal {
   std::shared_ptr<XQueryClient> client() const { return _client; }
   void setClient(std::shared_ptr<XQueryClient> client) { _client = std::move(client); }
 
+  // The tables that joins of this evaluation have made.
+  XQueryJoinMemo& joinMemo() { return *_joinMemo; }
+
   const XQueryLimits& limits() const { return _limits; }
   void setLimits(XQueryLimits limits) { _limits = std::move(limits); }
 
@@ -136,6 +140,7 @@ class XQueryContextInternal {
   Ref<NSURLLoader> _loader;
   NSURLTable<Value> _documentCache;  // documents, NSNull for failures
   NSURLTable<Ref<NSURLHandle>> _URLCache;
+  std::unique_ptr<XQueryJoinMemo> _joinMemo;
   Ref<XQueryError> _error;
   Ref<XQueryDate> _currentDateTime;
   XQueryProlog* _prolog = nullptr;

@@ -105,6 +105,8 @@ void XQueryFLWORExpr::bindInfoForProlog(XQueryProlog& prolog) {
   for (const auto& spec : _orderSpecs) spec->bindInfoForProlog(prolog);
   if (_returnExpr) _returnExpr->bindInfoForProlog(prolog);
   prolog.restoreLocalScope(scope);
+  const auto* last = _forLet.empty() ? nullptr : dyn_cast<XQueryForExpr>(_forLet.back().get());
+  _join = last ? XQueryForJoin::joinOf(*last, _whereExpr.get()) : nullptr;
 }
 
 void XQueryFLWORExpr::checkType(const XQueryBindingExpr& clause, const NSObject* value,
@@ -133,8 +135,9 @@ void XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toRe
 void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
                                   XQueryFLWORResults& toResults, XQueryContext& withContext) const {
   auto& dynamic = withContext._internal();
-  const XQueryClauseItems items(clause.expr(), true, withContext);
   const bool isLast = index + 1 == _forLet.size();
+  if (isLast && _join && evaluateJoin(clause, toResults, withContext)) return;
+  const XQueryClauseItems items(clause.expr(), true, withContext);
   for (size_t k = 0; k < items.count(); ++k) {
     checkWork();
     Value item = items[k];
@@ -152,12 +155,39 @@ void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
   }
 }
 
+// The tuples that the table of the join leaves over; false when it has nothing to say.
+bool XQueryFLWORExpr::evaluateJoin(const XQueryForExpr& clause, XQueryFLWORResults& toResults,
+                                   XQueryContext& withContext) const {
+  auto& dynamic = withContext._internal();
+  XQueryJoinTable::Selection selection;
+  const auto table = _join->select(*this, withContext, selection);
+  if (!table) return false;
+  for (const auto& match : selection) {
+    checkWork();
+    dynamic.setVariable(table->items()[match.position], clause.varID());
+    if (clause.posVarID()) {
+      dynamic.setVariable(NSNumber::numberWithLongLong(int64_t{match.position} + 1),
+                          clause.posVarID());
+    }
+    if (_join->decides(match)) {
+      addTuple(toResults, withContext);
+    } else {
+      processItem(toResults, withContext);
+    }
+  }
+  return true;
+}
+
 void XQueryFLWORExpr::processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const {
   if (_whereExpr) {
     const Value where = _whereExpr->evaluateWithContext(withContext);
     // Only false drops the tuple: an error record lets it through.
     if (XQueryEffectiveBooleanValue(where, withContext) == NSNumber::falseValue()) return;
   }
+  addTuple(toResults, withContext);
+}
+
+void XQueryFLWORExpr::addTuple(XQueryFLWORResults& toResults, XQueryContext& withContext) const {
   Value value = XQueryEvaluateOrEmpty(_returnExpr.get(), withContext);
   if (_orderSpecs.empty()) {
     toResults.values.add(std::move(value));

@@ -3,8 +3,10 @@
 
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQueryExpr.h"
+#include "Expr/XQueryJoin.h"
 #include "Expr/XQuerySequence.h"
 
+#include <memory>
 #include <utility>
 #include <vector>
 
@@ -111,7 +113,10 @@ class XQueryFLWORExpr : public XQueryExpr {
                           XQueryContext& withContext) const;
   void evaluateFor(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
                    XQueryContext& withContext) const;
+  bool evaluateJoin(const XQueryForExpr& clause, XQueryFLWORResults& toResults,
+                    XQueryContext& withContext) const;
   void processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
+  void addTuple(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
   void checkType(const XQueryBindingExpr& clause, const NSObject* value,
                  XQueryContext& context) const;
   void addSortItems(Value value, XQuerySortList& toList, XQueryContext& context) const;
@@ -120,6 +125,7 @@ class XQueryFLWORExpr : public XQueryExpr {
   Ref<XQueryExpr> _whereExpr;
   OrderSpecs _orderSpecs;
   Ref<XQueryExpr> _returnExpr;
+  std::unique_ptr<const XQueryForJoin> _join;  // of the last clause; found by binding
 };
 
 // "ordered {...}" and "unordered {...}": the ordering mode for the extent of the operand.

@@ -231,6 +231,10 @@ void XQueryAxisStep::stream(int axis, NSXMLNode* node, XQueryPathRun& run) const
 void XQueryAxisStep::filter(NSXMLNode* node, XQueryPathRun& run) const {
   std::vector<NSXMLNode*>& nodes = run.openNodeList();
   const size_t predicatesDone = collect(node, nodes, run);
+  if (run.listingStep == this) {
+    run.listed->insert(run.listed->end(), nodes.begin(), nodes.end());
+    return run.closeNodeList();
+  }
   filterNodes(nodes, predicatesDone, run.context);
   if (_next) {
     _next->processNodes(nodes, run);
@@ -343,6 +347,7 @@ void XQueryPathExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
   for (XQueryStep* step = _step.get(); step; step = step->next()) step->bindInfoForProlog(prolog);
   findShortcuts();
+  _join = XQueryPathJoin::joinOf(_step.get());
 }
 
 void XQueryPathExpr::findShortcuts() {
@@ -390,12 +395,8 @@ Value XQueryPathExpr::evaluateSteps(XQueryContext& context) const {
   const XQueryStep* step = _step.get();
   Value items = dynamic.contextItem();
   if (!isa<XQueryAxisStep>(step)) {
-    const XQueryExpr* first = step ? step->expr() : nullptr;
-    items = first ? first->evaluateWithContext(context) : Value(NSNull::null());
-    if (step) {
-      items = step->handlePreicatesFromIndex(0, std::move(items), context);
-      step = step->next();
-    }
+    items = step ? evaluateFirstStep(*step, context) : Value(NSNull::null());
+    if (step) step = step->next();
   }
   if (!step || isNull(items)) return items;
 
@@ -404,8 +405,77 @@ Value XQueryPathExpr::evaluateSteps(XQueryContext& context) const {
   run.setsEveryFocus = !allAreNodes(items);
   run.orderIsFree = dynamic.ordered();
   run.trailCount = _trailCount;
-  step->processValue(items, run, true);
+  if (!_join || !joinNodes(items, *step, run)) step->processValue(items, run, true);
   return results.value(dynamic.ordered());
+}
+
+Value XQueryPathExpr::evaluateFirstStep(const XQueryStep& step, XQueryContext& context) const {
+  Value items = step.expr() ? step.expr()->evaluateWithContext(context) : Value(NSNull::null());
+  if (_join && _join->step() == &step && joinItems(items, context)) return items;
+  return step.handlePreicatesFromIndex(0, std::move(items), context);
+}
+
+// --- joins ---------------------------------------------------------------------------------------
+
+// Filters the items of the first step by the table of the join; false when it has nothing to say.
+bool XQueryPathExpr::joinItems(Value& items, XQueryContext& context) const {
+  const auto listItems = [&items](std::vector<Value>& listed) {
+    const XQueryItemList list(items.get());
+    for (size_t i = 0; i < list.count(); ++i) {
+      if (!list[i] || list[i]->kind() == Kind::Null || isa<NSArray>(list[i])) return false;
+      listed.emplace_back(list[i]);
+    }
+    return true;
+  };
+  XQueryJoinTable::Selection selection;
+  const auto table = _join->select(*this, items, listItems, context, selection);
+  if (!table) return false;
+  const XQueryExpr& predicate = *_join->step()->predicates().front();
+  XQueryGatherer kept;
+  for (const auto& match : selection) {
+    const Value& item = table->items()[match.position];
+    const int64_t position = int64_t{match.position} + 1;
+    if (_join->decides(match) || XQueryStep::keeps(predicate, item.get(), position, context)) {
+      kept.add(item);
+    }
+  }
+  items = kept.value();
+  return true;
+}
+
+// The same for the nodes that reach the join's step from `firstStep`: hands on what is left.
+bool XQueryPathExpr::joinNodes(const Value& start, const XQueryStep& firstStep,
+                               XQueryPathRun& run) const {
+  const XQueryStep* joinStep = _join->step();
+  if (!isa<XQueryAxisStep>(joinStep) || run.setsEveryFocus) return false;
+  const auto listNodes = [&](std::vector<Value>& listed) {
+    XQueryPathRun listing(run.results, run.context);
+    listing.setsEveryFocus = false;
+    listing.trailCount = _trailCount;
+    listing.listingStep = joinStep;
+    listing.listed = &listed;
+    firstStep.processValue(start, listing, true);
+    return true;
+  };
+  XQueryJoinTable::Selection selection;
+  const auto table = _join->select(*this, start, listNodes, run.context, selection);
+  if (!table) return false;
+  const XQueryExpr& predicate = *joinStep->predicates().front();
+  std::vector<NSXMLNode*>& nodes = run.openNodeList();
+  for (const auto& match : selection) {
+    auto* node = cast<NSXMLNode>(table->items()[match.position]);
+    // The predicate cannot tell at which position the node stands.
+    if (_join->decides(match) || XQueryStep::keeps(predicate, node, 1, run.context)) {
+      nodes.push_back(node);
+    }
+  }
+  if (joinStep->next()) {
+    joinStep->next()->processNodes(nodes, run);
+  } else {
+    for (NSXMLNode* node : nodes) run.results.addNode(node, run.context);
+  }
+  run.closeNodeList();
+  return true;
 }
 
 }  // namespace xquery

@@ -7,9 +7,11 @@
 #pragma once
 
 #include "Expr/XQueryExpr.h"
+#include "Expr/XQueryJoin.h"
 #include "Expr/XQueryTypeDeclaration.h"
 #include "xquery/XMLNode.h"
 
+#include <memory>
 #include <optional>
 #include <vector>
 
@@ -51,6 +53,9 @@ class XQueryStep : public NSCounted {
   virtual void bindInfoForProlog(XQueryProlog& prolog);
   // Applies predicate `index` and those after it. The misspelling belongs to the name.
   Value handlePreicatesFromIndex(size_t index, Value items, XQueryContext& context) const;
+  // Whether the predicate keeps the item.
+  static bool keeps(const XQueryExpr& predicate, NSObject* item, int64_t position,
+                    XQueryContext& context);
   // Does nothing here.
   virtual void processItems(const Value& items, XQueryPathResults& toResults,
                             XQueryContext& forContext, bool validate) const;
@@ -99,6 +104,8 @@ class XQueryAxisStep : public XQueryStep {
     return _axis >= XQueryAxisAncestor && _axis <= XQueryAxisAncestorOrSelf;
   }
   static bool isValid(const NSXMLNode* node, const XQueryExpr* expr, XQueryContext& context);
+  // Whether asking the node test of a node may be an error.
+  bool testMayRaise() const;
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   void processItems(const Value& items, XQueryPathResults& toResults, XQueryContext& forContext,
@@ -119,7 +126,6 @@ class XQueryAxisStep : public XQueryStep {
   void stream(int axis, NSXMLNode* node, XQueryPathRun& run) const;
   void filter(NSXMLNode* node, XQueryPathRun& run) const;
   size_t collect(NSXMLNode* node, std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const;
-  bool testMayRaise() const;
   bool isDescendantShorthand() const;
   bool takesPlainChildren() const;
   bool mayWalkTwice(const XQueryAxisStep* previous) const;
@@ -203,10 +209,14 @@ class XQueryPathExpr : public XQueryExpr {
 
  private:
   Value evaluateSteps(XQueryContext& context) const;
+  Value evaluateFirstStep(const XQueryStep& step, XQueryContext& context) const;
+  bool joinItems(Value& items, XQueryContext& context) const;
+  bool joinNodes(const Value& start, const XQueryStep& firstStep, XQueryPathRun& run) const;
   void findShortcuts();
 
   Ref<XQueryStep> _step;
   size_t _trailCount = 0;
+  std::unique_ptr<const XQueryPathJoin> _join;  // found by binding
 };
 
 }  // namespace xquery

@@ -28,6 +28,10 @@ class XQueryPathRun {
   // The results will be sorted, so the order in which nodes arrive is free.
   bool orderIsFree = false;
 
+  // A step with predicates that only lists what it would filter, and where; null otherwise.
+  const XQueryStep* listingStep = nullptr;
+  std::vector<Value>* listed = nullptr;
+
   // How many steps of the path keep trails.
   size_t trailCount = 0;
   XQueryAxisTrail& trail(size_t index) {

@@ -43,27 +43,13 @@ bool selects(const Value& result, int64_t position, XQueryContext& context) {
   return XQueryIsTrue(XQueryEffectiveBooleanValue(result, context));
 }
 
-// Whether the predicate keeps the item at the position.
-bool keeps(const XQueryExpr& predicate, NSObject* item, int64_t position, XQueryContext& context) {
-  checkWork();
-  auto& dynamic = context._internal();
-  dynamic.setContextItem(item, position);
-  try {
-    return selects(predicate.evaluateWithContext(context), position, context);
-  } catch (const NSException&) {
-    if (XQueryIsLimit(dynamic.error().get())) throw;
-    dynamic.setError(nullptr, false);
-    return false;
-  }
-}
-
 Value keptItems(const Value& items, const XQueryExpr& predicate, XQueryContext& context) {
   const XQueryItemList list(items.get());
   context._internal().setLast(static_cast<int64_t>(list.count()));
   XQueryGatherer kept;
   for (size_t i = 0; i < list.count(); ++i) {
     NSObject* item = list[i];
-    const bool isKept = keeps(predicate, item, static_cast<int64_t>(i) + 1, context);
+    const bool isKept = XQueryStep::keeps(predicate, item, static_cast<int64_t>(i) + 1, context);
     if (isKept && item && item->kind() != Kind::Null) kept.add(item);
   }
   return kept.value();
@@ -75,12 +61,27 @@ void keepNodes(std::vector<NSXMLNode*>& nodes, const XQueryExpr& predicate,
   size_t kept = 0;
   for (size_t i = 0; i < nodes.size(); ++i) {
     NSXMLNode* node = nodes[i];
-    if (keeps(predicate, node, static_cast<int64_t>(i) + 1, context)) nodes[kept++] = node;
+    if (XQueryStep::keeps(predicate, node, static_cast<int64_t>(i) + 1, context))
+      nodes[kept++] = node;
   }
   nodes.resize(kept);
 }
 
 }  // namespace
+
+bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t position,
+                       XQueryContext& context) {
+  checkWork();
+  auto& dynamic = context._internal();
+  dynamic.setContextItem(item, position);
+  try {
+    return selects(predicate.evaluateWithContext(context), position, context);
+  } catch (const NSException&) {
+    if (XQueryIsLimit(dynamic.error().get())) throw;
+    dynamic.setError(nullptr, false);
+    return false;
+  }
+}
 
 std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicate) {
   const XQueryLiteral* literal = literalIn(predicate);

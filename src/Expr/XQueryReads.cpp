@@ -141,8 +141,7 @@ XQueryReads XQueryReadsOfSteps(const XQueryStep& first, const XQueryStep& end) {
 
 bool XQueryIsRepeatable(const XQueryExpr& expr, bool variablesMayChange) {
   const XQueryReads reads = XQueryReadsOf(expr);
-  return reads.isRepeatable &&
-         !(variablesMayChange && (reads.globals || !reads.variables.empty()));
+  return reads.isRepeatable && !(variablesMayChange && (reads.globals || !reads.variables.empty()));
 }
 
 }  // namespace xquery

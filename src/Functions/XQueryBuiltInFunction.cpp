@@ -268,9 +268,9 @@ Registry* makeRegistry() {
   registry->reserve(table.size());
   for (const auto& row : table) {
     const Ref<NSString> URI = XQueryModules::builtinNamespaceForID(row.namespaceID);
-    registry->emplace(XQueryQName::qname(NSString::stringWithASCII(row.localName), URI),
-                      make<XQueryBuiltInFunction>(row.proc ? row.proc : noAnswer,
-                                                  readsArgumentsOnly(row)));
+    registry->emplace(
+        XQueryQName::qname(NSString::stringWithASCII(row.localName), URI),
+        make<XQueryBuiltInFunction>(row.proc ? row.proc : noAnswer, readsArgumentsOnly(row)));
   }
   return registry;
 }

@@ -1,0 +1,121 @@
+// Items with their keys read, so that the items which meet a comparison with a probe are found
+// without evaluating the comparison for each item.
+//
+// The table answers what the comparison would answer. A key or a probe is
+//
+//   untyped   a node or an untyped value: compared by its text with text, as a number with numbers
+//   text      exactly xs:string: compared with text only
+//   number    compared with numbers, exactly when both are decimal and as doubles otherwise
+//
+// and everything else (dates, other string types, truth values) is compared the plain way. So are
+// items whose key could not be read, or mixes kinds, or is no number where a number is asked for:
+// comparing them may be an error, which must come up where it always does. A selection names these
+// items too and leaves it to the caller to ask for each.
+#pragma once
+
+#include "Expr/XQueryJoinCondition.h"
+#include "Expr/XQueryUntypedText.h"
+#include "xquery/Object.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <vector>
+
+namespace xquery {
+
+class XQueryJoinTable {
+ public:
+  struct Match {
+    uint32_t position;  // of the item, counted from 0
+    bool isSure;        // the comparison holds; otherwise it has to be asked
+    bool operator==(const Match&) const = default;
+  };
+  using Selection = std::vector<Match>;
+  // The value of the key for the item at a position; null when it cannot be had.
+  using KeyReader = std::function<Value(size_t position)>;
+
+  // A table for fewer items costs more than it saves.
+  static constexpr size_t fewestItems = 8;
+  static constexpr size_t mostItems = UINT32_MAX / 4;
+
+  // The positions count the items, which the table keeps alive.
+  XQueryJoinTable(const XQueryJoinCondition& condition, std::vector<Value> items,
+                  const KeyReader& keyOf);
+  XQueryJoinTable(const XQueryJoinTable&) = delete;
+  XQueryJoinTable& operator=(const XQueryJoinTable&) = delete;
+  ~XQueryJoinTable();
+
+  const std::vector<Value>& items() const { return _items; }
+
+  // Puts the items that meet the comparison with the probe, and those that have to be asked, into
+  // the list, in the order of the items, each once. False for a probe that has to be compared the
+  // plain way. Not for several threads at once: the table is completed by what it is asked.
+  bool select(const Value& probe, Selection& selection);
+
+ private:
+  // What a key or a probe is compared as.
+  struct Operand {
+    enum Kind : uint8_t { Other, Untyped, Text, Floating, ExactDecimal, InexactDecimal };
+    Kind kind = Other;
+    XQueryUntypedText text;  // of an untyped one and a text
+    double number = 0;       // of a number; of an untyped one once it is scanned
+
+    explicit Operand(NSObject* item);
+    bool isText() const { return kind == Untyped || kind == Text; }
+    bool isDecimal() const { return kind == ExactDecimal || kind == InexactDecimal; }
+    bool isNumber() const { return kind == Floating || isDecimal(); }
+    // Makes an untyped one a number; false when it begins with none.
+    bool scan();
+  };
+  using Operands = std::vector<Operand>;
+
+  // The keys of equal hash, in their order.
+  class Chains {
+   public:
+    template <class HashOf>
+    void build(size_t count, HashOf hashOf);
+    bool isBuilt() const { return !_heads.empty(); }
+    uint32_t first(uint32_t hash) const { return _heads[hash & (_heads.size() - 1)]; }
+    uint32_t next(uint32_t key) const { return _next[key]; }
+    size_t bytes() const { return (_heads.size() + _next.size()) * sizeof(uint32_t); }
+    static constexpr uint32_t end = UINT32_MAX;
+
+   private:
+    std::vector<uint32_t> _heads;
+    std::vector<uint32_t> _next;
+  };
+
+  void read(uint32_t position, const Value& value);
+  bool takes(const Operands& keys);
+  bool comparesAsNumbers(const Operands& probes) const;
+  void scanTexts();
+  void selectByText(const Operands& probes, Selection& selection);
+  void selectByNumber(const Operands& probes, Selection& selection);
+  template <class Key, class HashOf>
+  void selectBy(const std::vector<Key>& keys, const std::vector<Key>& probes, Chains& chains,
+                HashOf hashOf, Selection& selection);
+  void countMemory();
+
+  const XQueryRelation _relation;
+  const bool _isValueComparison;
+  bool _holdsTexts = false;    // the keys are untyped or texts ...
+  bool _holdsNumbers = false;  // ... or numbers; neither while there is no key
+  bool _hasDecimals = false;
+  bool _hasInexactDecimals = false;
+  bool _isScanned = false;
+  int64_t _countedBytes = 0;
+  std::vector<Value> _items;
+  std::vector<Value> _keptKeys;  // the atomic keys, to which the texts refer
+  Operands _keys;
+  std::vector<uint32_t> _positions;  // of the item of each key
+  std::vector<uint32_t> _irregular;  // positions of the items that have to be asked
+  std::vector<uint32_t> _irregularAsNumbers;
+  std::vector<NSStringView> _texts;  // of each key
+  std::vector<double> _numbers;      // of each key; NaN for one that is none
+  Chains _textChains;
+  Chains _numberChains;
+};
+
+}  // namespace xquery
