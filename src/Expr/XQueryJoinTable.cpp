@@ -16,19 +16,20 @@
 namespace xquery {
 namespace {
 
-// Every integer up to this magnitude is a double, and compares with doubles as itself.
+// Every integer below this magnitude is a double and no other integer is the same double.
 constexpr double exactIntegerBound = 1LL << std::numeric_limits<double>::digits;
 constexpr double notANumber = std::numeric_limits<double>::quiet_NaN();
 
+// NaN, whichever way it is stored, meets nothing.
 bool isFloating(const NSNumber& number) {
-  return number.storage() == NSNumber::Storage::Double ||
+  return std::isnan(number.doubleValue()) || number.storage() == NSNumber::Storage::Double ||
          number.storage() == NSNumber::Storage::Float;
 }
 
 bool isExactAsDouble(const NSNumber& number) {
   const NSDecimal* decimal = number.storedDecimal();
   if (decimal && !decimal->isSmallInteger()) return false;
-  return std::abs(number.doubleValue()) <= exactIntegerBound;
+  return std::abs(number.doubleValue()) < exactIntegerBound;
 }
 
 uint32_t hashOfDouble(double value) {

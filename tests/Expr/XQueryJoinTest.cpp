@@ -243,31 +243,31 @@ TEST(JoinTable, AnItemOfManyKeysIsSelectedOnce) {
 
 TEST(JoinTable, UntypedKeysMeetNumbersAsNumbersAndOthersAreAsked) {
   const std::vector<Value> keys = {untyped("1"), untyped("01"), untyped("x"), string("1")};
-  EXPECT_EQ(selected(condition(equal), keys, integer("1")), "0 1 2? 3?");
-  EXPECT_EQ(selected(condition(less), {untyped("5"), untyped("50")}, integer("10")), "0");
+  EXPECT_EQ(selected(condition(equal), keys, integer(1)), "0 1 2? 3?");
+  EXPECT_EQ(selected(condition(less), {untyped("5"), untyped("50")}, integer(10)), "0");
 }
 
 TEST(JoinTable, NaNMeetsNothing) {
-  EXPECT_EQ(selected(condition(less, true), {number("1"), nan()}, number("1")), "0");
-  EXPECT_EQ(selected(condition(equal), {number("1"), nan()}, nan()), "");
+  EXPECT_EQ(selected(condition(less, true), {number(1), nan()}, number(1)), "0");
+  EXPECT_EQ(selected(condition(equal), {number(1), nan()}, nan()), "");
 }
 
 TEST(JoinTable, DecimalsThatAreNoDoublesAreComparedThePlainWay) {
-  const std::vector<Value> keys = {integer("9007199254740993"), integer("1")};
-  EXPECT_EQ(selected(condition(equal), keys, integer("1")), "plain");
-  EXPECT_EQ(selected(condition(equal), keys, number("1")), "1");
-  EXPECT_EQ(selected(condition(equal), {integer("1")}, integer("9007199254740993")), "plain");
+  const std::vector<Value> keys = {integer(9007199254740993), integer(1)};
+  EXPECT_EQ(selected(condition(equal), keys, integer(1)), "plain");
+  EXPECT_EQ(selected(condition(equal), keys, number(1)), "1");
+  EXPECT_EQ(selected(condition(equal), {integer(1)}, integer(9007199254740993)), "plain");
 }
 
 TEST(JoinTable, KeysThatCannotBeReadOrMixKindsAreAsked) {
-  const std::vector<Value> keys = {untyped("1"), Value(), integer("1"), boolean(true), empty()};
+  const std::vector<Value> keys = {untyped("1"), Value(), integer(1), boolean(true), empty()};
   EXPECT_EQ(selected(condition(equal), keys, untyped("1")), "0 1? 2? 3?");
   EXPECT_EQ(selected(condition(equal), keys, empty()), "1? 2? 3?");
 }
 
 TEST(JoinTable, OtherProbesAreComparedThePlainWay) {
   EXPECT_EQ(selected(condition(equal), {untyped("true")}, boolean(true)), "plain");
-  EXPECT_EQ(selected(condition(equal), {untyped("1")}, sequence({untyped("1"), integer("1")})),
+  EXPECT_EQ(selected(condition(equal), {untyped("1")}, sequence({untyped("1"), integer(1)})),
             "plain");
   EXPECT_EQ(selected(condition(equal), {untyped("1")}, Value()), "plain");
 }
@@ -277,7 +277,7 @@ TEST(JoinTable, AValueComparisonTakesOneKeyAndOneProbe) {
   EXPECT_EQ(selected(eq, {sequence({untyped("a"), untyped("b")}), untyped("a")}, string("a")),
             "0? 1");
   EXPECT_EQ(selected(eq, {untyped("a")}, sequence({string("a"), string("b")})), "plain");
-  EXPECT_EQ(selected(eq, {untyped("1")}, integer("1")), "plain");
+  EXPECT_EQ(selected(eq, {untyped("1")}, integer(1)), "plain");
 }
 
 }  // namespace
