@@ -3,6 +3,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Prolog/XQueryProlog.h"
+#include "Types/NameCharacters.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"
@@ -13,6 +14,15 @@ namespace {
 NSXMLNameRef nodeName(const XQueryQName& name) {
   const Ref<NSString>& URI = name.namespaceURI();
   return {name.XQueryStringValue()->view(), URI ? URI->view() : NSStringView()};
+}
+
+// A cast asks for no more than a prefix that is known, so that any text may be a QName; a node
+// whose name no parser would read back is not made of it. The prefix of declarations is no
+// element's; an attribute that has it gets another when it is written, or has an error of its own.
+bool mayBeNodeName(const XQueryQName& name, Kind nodeKind) {
+  const Ref<NSString>& prefix = name.prefixHint();
+  if (nodeKind == Kind::Element && prefix && prefix->view() == "xmlns") return false;
+  return XQueryIsNodeName(name.XQueryStringValue()->view());
 }
 
 bool hasPrefix(NSStringView name) {
@@ -59,6 +69,7 @@ void XQueryConstructorName::bindUnresolved(XQueryProlog& prolog, int64_t line) {
 }
 
 void XQueryConstructorName::bind(XQueryProlog& prolog, Kind nodeKind, int64_t line) {
+  _nodeKind = nodeKind;
   if (_nameExpr || !_name) {
     if (_nameExpr) _nameExpr->bindInfoForProlog(prolog);
   } else if (const Ref<XQueryQName> qName = resolved(prolog, nodeKind)) {
@@ -84,7 +95,9 @@ NSXMLNameRef XQueryConstructorName::evaluate(XQueryContext& context, int64_t lin
       XQueryAtomizationCheckingOccurrence(value, XQueryOccurrenceExactlyOne, context);
   const Value name = XQueryCastAs(item, XQueryTypeQName, context);
   const auto* qName = dyn_cast<XQueryQName>(name);
-  if (!qName) context._internal().raise(XQueryErrors::invalidType.errorAtLine(line));
+  if (!qName || !mayBeNodeName(*qName, _nodeKind)) {
+    context._internal().raise(XQueryErrors::invalidType.errorAtLine(line));
+  }
   return nodeName(*qName);
 }
 

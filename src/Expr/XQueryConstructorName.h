@@ -25,7 +25,8 @@ class XQueryConstructorName {
   // context's namespaces elsewhere.
   void bind(XQueryProlog& prolog, Kind nodeKind, int64_t line);
 
-  // Raises error 1 for a name that has no namespace even now, error 6 for a value that is no name.
+  // Raises error 1 for a name that has no namespace even now, error 6 for a value that is no name
+  // of a node.
   NSXMLNameRef evaluate(XQueryContext& context, int64_t line) const;
 
  private:
@@ -35,6 +36,7 @@ class XQueryConstructorName {
 
   Ref<NSString> _name;
   Ref<XQueryExpr> _nameExpr;
+  Kind _nodeKind = Kind::None;
   // The name that the expression gives without being evaluated: always, or while the context has no
   // default namespace.
   NSXMLNameRef _constant;

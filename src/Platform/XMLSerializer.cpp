@@ -465,8 +465,10 @@ void Serializer::declareForName(const NSXMLElement* element) {
 NSStringView Serializer::prefixForAttribute(const NSXMLElement* element,
                                             const NSXMLNode* attribute) {
   const Declaration needed{attribute->prefixView(), attribute->URIView()};
-  if (isReserved(needed.prefix)) return needed.prefix;
-  if (!needed.prefix.isEmpty()) {
+  // This namespace has one prefix, which is never declared, and the reserved ones stand for no
+  // other.
+  if (needed.URI == "http://www.w3.org/XML/1998/namespace") return ascii("xml");
+  if (!needed.prefix.isEmpty() && !isReserved(needed.prefix)) {
     if (_scope.URIForPrefix(needed.prefix).equals(needed.URI)) return needed.prefix;
     if (!isTaken(needed.prefix)) {
       declare(element, needed);

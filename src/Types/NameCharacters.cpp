@@ -147,4 +147,55 @@ constinit const XQueryCharSet XQueryNCNameCharSet(sNCNameCharSetSource);
 constinit const XQueryCharSet XQueryNameFirstCharSet(withColon(sNCNameFirstCharSetSource));
 constinit const XQueryCharSet XQueryNameCharSet(withColon(sNCNameCharSetSource));
 
+namespace {
+
+struct WideRange {
+  uint32_t first, last;
+};
+
+constexpr WideRange nodeNameFirst[] = {
+    {'A', 'Z'},       {'_', '_'},       {'a', 'z'},       {0xC0, 0xD6},     {0xD8, 0xF6},
+    {0xF8, 0x2FF},    {0x370, 0x37D},   {0x37F, 0x1FFF},  {0x200C, 0x200D}, {0x2070, 0x218F},
+    {0x2C00, 0x2FEF}, {0x3001, 0xD7FF}, {0xF900, 0xFDCF}, {0xFDF0, 0xFFFD}, {0x10000, 0xEFFFF},
+};
+constexpr WideRange nodeNameOther[] = {
+    {'-', '.'}, {'0', '9'}, {0xB7, 0xB7}, {0x300, 0x36F}, {0x203F, 0x2040},
+};
+
+bool isIn(std::span<const WideRange> ranges, uint32_t character) {
+  for (const WideRange& range : ranges) {
+    if (character >= range.first && character <= range.last) return true;
+  }
+  return false;
+}
+
+// The character at the index, which is moved past it; half a surrogate pair is one by itself.
+uint32_t nextCharacter(NSStringView text, uint32_t& index) {
+  const char16_t unit = text[index++];
+  if (unit < 0xD800 || unit > 0xDBFF || index == text.length()) return unit;
+  const char16_t low = text[index];
+  if (low < 0xDC00 || low > 0xDFFF) return unit;
+  ++index;
+  return 0x10000 + ((unit - 0xD800U) << 10) + (low - 0xDC00U);
+}
+
+}  // namespace
+
+bool XQueryIsNodeName(NSStringView text) {
+  bool isFirst = true;
+  bool hasColon = false;
+  for (uint32_t index = 0; index < text.length();) {
+    const uint32_t character = nextCharacter(text, index);
+    if (character == ':' && !isFirst && !hasColon) {
+      hasColon = isFirst = true;
+      continue;
+    }
+    if (!isIn(nodeNameFirst, character) && (isFirst || !isIn(nodeNameOther, character))) {
+      return false;
+    }
+    isFirst = false;
+  }
+  return !isFirst;
+}
+
 }  // namespace xquery

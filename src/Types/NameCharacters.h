@@ -1,6 +1,7 @@
-// The characters that XML 1.0 (Appendix B) allows in names, as sets of 16-bit code units.
+// The characters that XML 1.0 (Appendix B) allows in names, as sets of 16-bit code units, and the
+// wider names that a document may hold.
 //
-// Characters outside the BMP are never members, so a surrogate never is one.
+// Characters outside the BMP are never members of the sets, so a surrogate never is one.
 #pragma once
 
 #include "xquery/String.h"
@@ -26,6 +27,11 @@ extern const XQueryCharSet XQueryNCNameFirstCharSet;  // Letter and "_"
 extern const XQueryCharSet XQueryNCNameCharSet;       // NameChar without ":"
 extern const XQueryCharSet XQueryNameFirstCharSet;    // NCName first and ":"
 extern const XQueryCharSet XQueryNameCharSet;         // NCName and ":"
+
+// Whether a parser takes the text as the qualified name of a node: an NCName, or two with a colon
+// between them. The characters are those of the fifth edition of XML 1.0, which all parsers go by
+// today, so that every name of a parsed document passes.
+bool XQueryIsNodeName(NSStringView text);
 
 // Tab, line feed, carriage return and space.
 constexpr bool XQueryIsWhiteSpace(char16_t unit) {

@@ -221,6 +221,25 @@ TEST_F(ElementExpr, TextNodesAreNeverAdopted) {
   EXPECT_EQ(a->childCount(), 1u);
 }
 
+TEST_F(ElementExpr, ThePrefixOfDeclarationsIsNoElements) {
+  const Value name = XQueryQName::qname(text("xmlns:a"), text("urn:a"));
+  const auto expr = XQueryElementExpr::elementExprWithNameExpr(constant(name), nullptr);
+  EXPECT_EQ(errorOf(*expr), "6 1 invalid type");
+}
+
+TEST_F(ElementExpr, APrefixWithoutANamespaceNamesNoElement) {
+  for (const auto& URI : {Ref<NSString>(), text("")}) {
+    const Value name = XQueryQName::qname(text("p:a"), URI);
+    const auto expr = XQueryElementExpr::elementExprWithNameExpr(constant(name), nullptr);
+    EXPECT_EQ(errorOf(*expr), "6 1 invalid type");
+  }
+}
+
+TEST_F(ElementExpr, AnAttributeWithThePrefixOfDeclarationsIsWrittenWithAnother) {
+  const auto attribute = NSXMLNode::attributeWithName(view("xmlns:a"), view("1"), view("urn:a"));
+  EXPECT_EQ(xmlOf(*direct("e", {constant(attribute)})), "<e xmlns:ns1=\"urn:a\" ns1:a=\"1\"/>");
+}
+
 TEST_F(ElementExpr, AttributesOfOnePrefixAndDifferentURIsAreBothKept) {
   const auto one = NSXMLNode::attributeWithName(view("p:b"), view("1"), view("urn:1"));
   const auto two = NSXMLNode::attributeWithName(view("p:b"), view("2"), view("urn:2"));

@@ -155,6 +155,19 @@ TEST(XMLSerializer, AnElementWithoutNamespaceLeavesTheDefaultNamespace) {
   EXPECT_EQ(written(a.get()), "<a xmlns=\"u\"><b xmlns=\"\"/></a>");
 }
 
+TEST(XMLSerializer, ReservedPrefixesStandForNothingElse) {
+  const auto element = NSXMLElement::elementWithName(NSStringView::ascii("e"));
+  for (const char* name : {"xml:a", "xmlns:b"}) {
+    element->addAttribute(NSXMLNode::attributeWithName(
+        NSStringView::ascii(name), NSStringView::ascii("1"), NSStringView::ascii("urn:x")));
+  }
+  element->addAttribute(
+      NSXMLNode::attributeWithName(NSStringView::ascii("p:lang"), NSStringView::ascii("en"),
+                                   NSStringView::ascii("http://www.w3.org/XML/1998/namespace")));
+  EXPECT_EQ(element->XMLString()->utf8(),
+            "<e xmlns:ns1=\"urn:x\" ns1:a=\"1\" ns1:b=\"1\" xml:lang=\"en\"/>");
+}
+
 TEST(XMLSerializer, AttributesWithClashingPrefixesGetFreeOnes) {
   const auto a = NSXMLElement::elementWithName(A("p:a"), A("u"));
   EXPECT_TRUE(a->addAttribute(NSXMLNode::attributeWithName(A("p:x"), A("1"), A("v"))));

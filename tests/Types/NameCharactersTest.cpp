@@ -105,5 +105,40 @@ TEST(NameCharacters, WhiteSpaceIsFourCharacters) {
   }
 }
 
+bool isNodeName(std::u16string_view text) {
+  return XQueryIsNodeName(NSString::stringWithUTF16(text)->view());
+}
+
+TEST(NameCharacters, NodeNamesAreQualifiedNames) {
+  for (const auto* name : {u"a", u"_", u"A-b.c9", u"p:a", u"\u00E9", u"a\u00B7", u"\u0370",
+                           u"\U00010000", u"\U000EFFFFx", u"a\u0300:\u4E00"}) {
+    EXPECT_TRUE(isNodeName(name));
+  }
+  for (const auto* text : {u"", u":", u"a:", u":a", u"a:b:c", u"a b", u"1a", u"-a", u".", u"a:1",
+                           u"a\u00D7", u"\u0300", u"a\u2028", u"\u00B7", u"a/b", u" a", u"a\n"}) {
+    EXPECT_FALSE(isNodeName(text));
+  }
+}
+
+TEST(NameCharacters, HalfAPairIsNoNameCharacter) {
+  EXPECT_FALSE(isNodeName(std::u16string(1, char16_t{0xD800})));
+  EXPECT_FALSE(isNodeName(std::u16string{u'a', char16_t{0xDC00}}));
+  EXPECT_FALSE(isNodeName(std::u16string{u'a', char16_t{0xD800}, u'a'}));
+  EXPECT_FALSE(isNodeName(u"\U000F0000"));
+}
+
+// The sets of the first edition lie within: what a query can write may be built.
+TEST(NameCharacters, WhatTheSetsHoldMayNameNodes) {
+  for (uint32_t index = 0; index <= 0xFFFF; ++index) {
+    const auto unit = static_cast<char16_t>(index);
+    if (XQueryNCNameFirstCharSet.contains(unit)) {
+      ASSERT_TRUE(isNodeName(std::u16string(1, unit))) << index;
+    }
+    if (XQueryNCNameCharSet.contains(unit)) {
+      ASSERT_TRUE(isNodeName(std::u16string{u'a', unit})) << index;
+    }
+  }
+}
+
 }  // namespace
 }  // namespace xquery
