@@ -17,11 +17,15 @@ NSXMLNameRef nodeName(const XQueryQName& name) {
 }
 
 // A cast asks for no more than a prefix that is known, so that any text may be a QName; a node
-// whose name no parser would read back is not made of it. The prefix of declarations is no
-// element's; an attribute that has it gets another when it is written, or has an error of its own.
+// whose name no parser would read back is not made of it. A prefix needs a namespace to be declared
+// with. The prefix of declarations is no element's; an attribute that has it gets another when it
+// is written, or has an error of its own.
 bool mayBeNodeName(const XQueryQName& name, Kind nodeKind) {
   const Ref<NSString>& prefix = name.prefixHint();
-  if (nodeKind == Kind::Element && prefix && prefix->view() == "xmlns") return false;
+  if (prefix && prefix->length() > 0) {
+    if (!name.namespaceURI() || name.namespaceURI()->length() == 0) return false;
+    if (nodeKind == Kind::Element && prefix->view() == "xmlns") return false;
+  }
   return XQueryIsNodeName(name.XQueryStringValue()->view());
 }
 
