@@ -7,6 +7,7 @@
 #include "Expr/XQueryPath.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/NSLog.h"
+#include "Types/XQueryAtomization.h"
 #include "xquery/Number.h"
 
 #include <array>
@@ -37,11 +38,24 @@ Value valueOrNull(const XQueryExpr& expr, XQueryContext& context) {
   }
 }
 
+enum class Answer : uint8_t { No, Yes, Failure };
+
+// What the conditions, joined by "and", come to.
+Answer answerOf(const std::vector<const XQueryExpr*>& conditions, XQueryContext& context) {
+  for (const XQueryExpr* condition : conditions) {
+    const Value value = valueOrNull(*condition, context);
+    if (!value) return Answer::Failure;
+    if (!XQueryIsTrue(XQueryEffectiveBooleanValue(value, context))) return Answer::No;
+  }
+  return Answer::Yes;
+}
+
 // Asks the memo, makes the table when it is worth it, and asks the table.
 template <class MakeTable>
 std::shared_ptr<XQueryJoinTable> selectFromMemo(const XQueryExpr& owner,
                                                 std::span<const Value> dependencies,
-                                                const XQueryExpr& probe, XQueryContext& context,
+                                                const XQueryJoinCondition& condition,
+                                                XQueryContext& context,
                                                 XQueryJoinTable::Selection& selection,
                                                 MakeTable makeTable) {
   if (XQueryLogEnabled()) return nullptr;
@@ -56,8 +70,13 @@ std::shared_ptr<XQueryJoinTable> selectFromMemo(const XQueryExpr& owner,
     case XQueryJoinMemo::Use::Further:
       break;
   }
-  if (!table || !table->select(valueOrNull(probe, context), selection)) return nullptr;
-  return table;
+  if (!table) return nullptr;
+  const Answer guards = answerOf(condition.guards, context);
+  if (guards == Answer::Failure) return nullptr;
+  // Without a probe nothing is met, but what may be an error has still to be asked.
+  const Value probe =
+      guards == Answer::Yes ? valueOrNull(*condition.probe, context) : Value(NSNull::null());
+  return table->select(probe, selection) ? table : nullptr;
 }
 
 bool isWorthATable(const std::vector<Value>& items) {
@@ -71,25 +90,24 @@ bool isWorthATable(const std::vector<Value>& items) {
 std::unique_ptr<const XQueryForJoin> XQueryForJoin::joinOf(const XQueryForExpr& clause,
                                                            const XQueryExpr* where) {
   if (!where || !clause.expr() || clause.type() || clause.varID() == 0) return nullptr;
-  const int64_t varID = clause.varID();
-  const auto isKey = [varID](const XQueryExpr& expr) {
-    const XQueryReads reads = XQueryReadsOf(expr);
-    return reads.isRepeatable && !reads.focus && !reads.outside && !reads.globals &&
-           reads.variables == std::vector<int64_t>{varID};
+  const auto reads = [&clause](const XQueryExpr& expr) {
+    const XQueryReads read = XQueryReadsOf(expr);
+    if (!read.isRepeatable) return XQueryJoinReads::Unknown;
+    const bool readsItem = read.readsVariable(clause.varID());
+    const bool readsPosition = clause.posVarID() && read.readsVariable(clause.posVarID());
+    if (!readsItem && !readsPosition) return XQueryJoinReads::Round;
+    const bool readsMore =
+        read.variables.size() > 1 || read.focus || read.outside || read.globals || readsPosition;
+    return readsMore ? XQueryJoinReads::Unknown : XQueryJoinReads::Item;
   };
-  const auto isProbe = [&clause](const XQueryExpr& expr) {
-    const XQueryReads reads = XQueryReadsOf(expr);
-    return reads.isRepeatable && !reads.readsVariable(clause.varID()) &&
-           !(clause.posVarID() && reads.readsVariable(clause.posVarID()));
-  };
-  const auto condition = XQueryJoinCondition::in(where, false, isKey, isProbe);
+  auto condition = XQueryJoinCondition::in(where, false, reads);
   if (!condition.key) return nullptr;
   XQueryReads itemReads = XQueryReadsOf(*clause.expr());
   const bool isSettled =
       itemReads.isRepeatable && !itemReads.outside && itemReads.variables.size() <= mostVariables;
   if (!isSettled) return nullptr;
   return std::unique_ptr<const XQueryForJoin>(
-      new XQueryForJoin(clause, condition, std::move(itemReads)));
+      new XQueryForJoin(clause, std::move(condition), std::move(itemReads)));
 }
 
 std::shared_ptr<XQueryJoinTable> XQueryForJoin::select(
@@ -102,7 +120,7 @@ std::shared_ptr<XQueryJoinTable> XQueryForJoin::select(
   for (const int64_t varID : _itemReads.variables) {
     dependencies[count++] = dynamic.variableForID(varID);
   }
-  return selectFromMemo(owner, {dependencies.data(), count}, *_condition.probe, context, selection,
+  return selectFromMemo(owner, {dependencies.data(), count}, _condition, context, selection,
                         [&] { return makeTable(context); });
 }
 
@@ -123,7 +141,14 @@ std::shared_ptr<XQueryJoinTable> XQueryForJoin::makeTable(XQueryContext& context
   if (!isWorthATable(items)) return nullptr;
   const auto keyOf = [&](size_t position) {
     context._internal().setVariable(items[position], _clause.varID());
-    return valueOrNull(*_condition.key, context);
+    switch (answerOf(_condition.filters, context)) {
+      case Answer::Yes:
+        return valueOrNull(*_condition.key, context);
+      case Answer::No:  // as an item without a key, it meets nothing
+        return Value(NSNull::null());
+      default:
+        return Value();
+    }
   };
   return std::make_shared<XQueryJoinTable>(_condition, items, keyOf);
 }
@@ -131,14 +156,12 @@ std::shared_ptr<XQueryJoinTable> XQueryForJoin::makeTable(XQueryContext& context
 // --- paths ---------------------------------------------------------------------------------------
 
 std::unique_ptr<const XQueryPathJoin> XQueryPathJoin::joinOf(const XQueryStep* firstStep) {
-  const auto isKey = [](const XQueryExpr& expr) {
-    const XQueryReads reads = XQueryReadsOf(expr);
-    return reads.isRepeatable && reads.focus && !reads.outside && !reads.globals &&
-           reads.variables.empty();
-  };
-  const auto isProbe = [](const XQueryExpr& expr) {
-    const XQueryReads reads = XQueryReadsOf(expr);
-    return reads.isRepeatable && !reads.focus;
+  const auto itemReads = [](const XQueryExpr& expr) {
+    const XQueryReads read = XQueryReadsOf(expr);
+    if (!read.isRepeatable) return XQueryJoinReads::Unknown;
+    if (!read.focus) return XQueryJoinReads::Round;
+    const bool readsMore = read.outside || read.globals || !read.variables.empty();
+    return readsMore ? XQueryJoinReads::Unknown : XQueryJoinReads::Item;
   };
   const XQueryStep* firstAxisStep = isa<XQueryAxisStep>(firstStep) ? firstStep : nullptr;
   for (const XQueryStep* step = firstStep; step; step = step->next()) {
@@ -147,8 +170,7 @@ std::unique_ptr<const XQueryPathJoin> XQueryPathJoin::joinOf(const XQueryStep* f
     if (axisStep && axisStep->testMayRaise()) return nullptr;
     if (axisStep && !firstAxisStep) firstAxisStep = step;
     if (step->predicates().size() != 1) continue;
-    const auto condition =
-        XQueryJoinCondition::in(step->predicates().front().get(), true, isKey, isProbe);
+    auto condition = XQueryJoinCondition::in(step->predicates().front().get(), true, itemReads);
     if (!condition.key) continue;
     if (axisStep) {
       if (step->next() && !isa<XQueryAxisStep>(step->next())) return nullptr;
@@ -156,7 +178,7 @@ std::unique_ptr<const XQueryPathJoin> XQueryPathJoin::joinOf(const XQueryStep* f
       const bool isSettled = reads.isRepeatable && !reads.outside && reads.variables.empty();
       if (!isSettled) return nullptr;
     }
-    return std::unique_ptr<const XQueryPathJoin>(new XQueryPathJoin(*step, condition));
+    return std::unique_ptr<const XQueryPathJoin>(new XQueryPathJoin(*step, std::move(condition)));
   }
   return nullptr;
 }
@@ -178,7 +200,7 @@ std::shared_ptr<XQueryJoinTable> XQueryPathJoin::select(
     dynamic.setContextItem(item, position);
     return table;
   };
-  return selectFromMemo(owner, {&start, 1}, *_condition.probe, context, selection, makeTable);
+  return selectFromMemo(owner, {&start, 1}, _condition, context, selection, makeTable);
 }
 
 }  // namespace xquery

@@ -16,7 +16,7 @@
 #include "Expr/XQueryReads.h"
 
 #include <memory>
-#include <optional>
+#include <utility>
 
 namespace xquery {
 
@@ -41,7 +41,7 @@ class XQueryForJoin {
 
  private:
   XQueryForJoin(const XQueryForExpr& clause, XQueryJoinCondition condition, XQueryReads itemReads)
-      : _clause(clause), _condition(condition), _itemReads(std::move(itemReads)) {}
+      : _clause(clause), _condition(std::move(condition)), _itemReads(std::move(itemReads)) {}
   std::shared_ptr<XQueryJoinTable> makeTable(XQueryContext& context) const;
 
   const XQueryForExpr& _clause;
@@ -69,7 +69,7 @@ class XQueryPathJoin {
 
  private:
   XQueryPathJoin(const XQueryStep& step, XQueryJoinCondition condition)
-      : _step(step), _condition(condition) {}
+      : _step(step), _condition(std::move(condition)) {}
 
   const XQueryStep& _step;
   XQueryJoinCondition _condition;

@@ -3,13 +3,15 @@
 #include "Expr/XQueryLists.h"
 #include "Expr/XQueryOperatorExpr.h"
 
+#include <cstddef>
 #include <optional>
+#include <utility>
 
 namespace xquery {
 namespace {
 
-// Bounds the work on a long chain of conditions.
-constexpr int mostConditions = 16;
+// Longer chains of conditions are left alone.
+constexpr size_t mostConditions = 16;
 
 const XQueryExpr* withoutParentheses(const XQueryExpr* expr) {
   const auto* list = dyn_cast<XQueryExprList>(expr);
@@ -50,47 +52,77 @@ XQueryRelation mirrored(XQueryRelation relation) {
   return relation;
 }
 
-XQueryJoinCondition conditionOf(const XQueryOperatorExpr& comparison,
-                                const XQueryJoinCondition::Accepts& isKey,
-                                const XQueryJoinCondition::Accepts& isProbe) {
+XQueryJoinCondition comparisonIn(const XQueryExpr& condition,
+                                 const XQueryJoinCondition::Reads& reads) {
   XQueryJoinCondition found;
-  const auto code = relationCode(comparison.operatorType());
-  const XQueryExpr* left = comparison.left();
-  const XQueryExpr* right = comparison.right();
-  if (!code || !left || !right) return found;
+  const auto* comparison = dyn_cast<XQueryOperatorExpr>(&condition);
+  const auto code = comparison ? relationCode(comparison->operatorType()) : std::nullopt;
+  if (!code || !comparison->left() || !comparison->right()) return found;
   found.relation = XQueryRelationForCode(*code);
-  found.isValueComparison = comparison.operatorType() >= XQueryOperatorEq;
-  if (isKey(*left) && isProbe(*right)) {
-    found.key = left;
-    found.probe = right;
-  } else if (isKey(*right) && isProbe(*left)) {
-    found.key = right;
-    found.probe = left;
+  found.isValueComparison = comparison->operatorType() >= XQueryOperatorEq;
+  const XQueryExpr* left = comparison->left();
+  const XQueryExpr* right = comparison->right();
+  if (reads(*right) == XQueryJoinReads::Item) {
+    std::swap(left, right);
     found.relation = mirrored(found.relation);
   }
+  if (reads(*left) == XQueryJoinReads::Item && reads(*right) == XQueryJoinReads::Round) {
+    found.key = left;
+    found.probe = right;
+  }
   return found;
+}
+
+// The conditions that "and" joins, in their order; none for too long a chain.
+std::vector<const XQueryExpr*> conjuncts(const XQueryExpr* condition) {
+  std::vector<const XQueryExpr*> found;
+  std::vector<const XQueryExpr*> waiting = {condition};
+  while (!waiting.empty()) {
+    const XQueryExpr* next = withoutParentheses(waiting.back());
+    waiting.pop_back();
+    const auto* both = dyn_cast<XQueryOperatorExpr>(next);
+    if (both && both->operatorType() == XQueryOperatorAnd) {
+      waiting.push_back(both->right());
+      waiting.push_back(both->left());
+    } else {
+      found.push_back(next);
+    }
+    if (!next || found.size() + waiting.size() > mostConditions) return {};
+  }
+  return found;
+}
+
+// How much a comparison promises to exclude. One that is the same in every round excludes the same
+// items each time, which says nothing about how many.
+int promiseOf(const XQueryJoinCondition& comparison) {
+  if (!comparison.key) return 0;
+  if (comparison.relation.test != XQueryRelation::Equal) return 1;
+  const XQueryReads probe = XQueryReadsOf(*comparison.probe);
+  return probe.focus || probe.globals || !probe.variables.empty() ? 3 : 2;
 }
 
 }  // namespace
 
 XQueryJoinCondition XQueryJoinCondition::in(const XQueryExpr* condition, bool errorExcludes,
-                                            const Accepts& isKey, const Accepts& isProbe) {
-  const auto* whole = dyn_cast<XQueryOperatorExpr>(withoutParentheses(condition));
-  const auto* rest = whole;
-  for (int looked = 0; rest && looked < mostConditions; ++looked) {
-    const bool isAnd = rest->operatorType() == XQueryOperatorAnd;
-    const auto* candidate = isAnd && errorExcludes
-                                ? dyn_cast<XQueryOperatorExpr>(withoutParentheses(rest->right()))
-                                : rest;
-    if (candidate && (!isAnd || errorExcludes)) {
-      XQueryJoinCondition found = conditionOf(*candidate, isKey, isProbe);
-      found.isWhole = candidate == whole;
-      if (found.key) return found;
+                                            const Reads& reads) {
+  const auto all = conjuncts(condition);
+  XQueryJoinCondition best;
+  std::vector<const XQueryExpr*> filters;
+  std::vector<const XQueryExpr*> guards;
+  for (const XQueryExpr* conjunct : all) {
+    XQueryJoinCondition found = comparisonIn(*conjunct, reads);
+    if (promiseOf(found) > promiseOf(best)) {
+      best = std::move(found);
+      best.isWhole = conjunct == all.back() && filters.size() + guards.size() + 1 == all.size();
+      best.filters = filters;
+      best.guards = guards;
     }
-    if (!isAnd) break;
-    rest = dyn_cast<XQueryOperatorExpr>(withoutParentheses(rest->left()));
+    if (errorExcludes) continue;
+    const XQueryJoinReads read = reads(*conjunct);
+    if (read == XQueryJoinReads::Unknown) break;
+    (read == XQueryJoinReads::Item ? filters : guards).push_back(conjunct);
   }
-  return {};
+  return best;
 }
 
 }  // namespace xquery

@@ -4,26 +4,39 @@
 
 #include "Expr/XQueryComparison.h"
 #include "Expr/XQueryExpr.h"
+#include "Expr/XQueryReads.h"
 
 #include <functional>
+#include <vector>
 
 namespace xquery {
 
+// What an expression reads while items are picked.
+enum class XQueryJoinReads : uint8_t {
+  Item,     // the item, whose inside does not change, and nothing else
+  Round,    // anything but the item
+  Unknown,  // both, or it is not repeatable
+};
+
 struct XQueryJoinCondition {
-  const XQueryExpr* key = nullptr;
+  const XQueryExpr* key = nullptr;  // null when there is no such comparison
   const XQueryExpr* probe = nullptr;
   XQueryRelation relation{};  // of a key to a probe; never "not equal"
   // A value comparison wants one item on each side, a general one takes any number.
   bool isValueComparison = false;
-  // The condition is nothing but this comparison; otherwise it is one of several joined by "and".
+  // The comparison, filters and guards are the whole condition.
   bool isWhole = false;
+  // The conditions before the comparison, all joined by "and": those that read the item only, and
+  // those that do not read it.
+  std::vector<const XQueryExpr*> filters;
+  std::vector<const XQueryExpr*> guards;
 
-  using Accepts = std::function<bool(const XQueryExpr&)>;
-  // Finds the comparison in a condition. An item that it excludes must be excluded by the whole:
-  // of several comparisons the first one is asked, or any one where an error excludes as well. The
-  // key is null when there is none.
+  using Reads = std::function<XQueryJoinReads(const XQueryExpr&)>;
+  // Of several comparisons joined by "and" the one that promises to exclude most. An item that it
+  // excludes is excluded by the whole condition: where an error excludes as well (`errorExcludes`)
+  // whatever the others are, and otherwise because only filters and guards stand before it.
   static XQueryJoinCondition in(const XQueryExpr* condition, bool errorExcludes,
-                                const Accepts& isKey, const Accepts& isProbe);
+                                const Reads& reads);
 };
 
 }  // namespace xquery

@@ -95,9 +95,11 @@ TEST(Join, ForClausesAnswerAsThePlainWay) {
     const Value document = parsed(text);
     const std::string probe = generate.oneOf({"$p", "$p", "$p", "($p, 2)", "string($p)", "$p/@k"});
     std::string where = generate.comparison(generate.key("$x"), probe);
-    const size_t more = generate.below(6);
+    const size_t more = generate.below(9);
     if (more == 0) where += " and $x/@n > 3";
     if (more == 1) where = "$x/@n != 3 and " + where;
+    if (more == 3) where = "$p = ('1', 1) and " + where + " and $x/c";
+    if (more == 4) where = "$x/c > 1 and ($p != '2' and " + where + ")";
     if (more == 2) where = "(" + where + ")";
     const std::string position = generate.below(3) == 0 ? " at $i" : "";
     const std::string value = position.empty() ? "string($x/@n)" : "($i, string($x/@n))";
@@ -123,6 +125,7 @@ TEST(Join, PredicatesAnswerAsThePlainWay) {
     const size_t more = generate.below(6);
     if (more == 0) predicate += " and @n > 3";
     if (more == 1) predicate = "@n != 3 and " + predicate;
+    if (more == 3) predicate = "c > 1 and " + predicate + " and $p = ('1', 1)";
     if (more == 2) predicate = "(" + predicate + ")";
     const std::string path = generate.items();
     const std::string rest =
@@ -183,21 +186,23 @@ TEST(Join, AnErrorOfTheReturnClauseComesUpInItsTurn) {
   EXPECT_EQ(answer(round + "error((), 'met')", document).substr(0, 6), "error ");
 }
 
-// Each of these would take some minutes the plain way.
+// Each of these would take a minute the plain way.
 TEST(Join, TakesTimeInProportionToItsItems) {
   std::string text = "<r>";
-  for (int i = 0; i < 30000; ++i) {
-    text += "<i k='" + std::to_string(i) + "'><v>" + std::to_string(i * 7 % 30000) + "</v></i>";
+  for (int i = 0; i < 10000; ++i) {
+    text += "<i k='" + std::to_string(i) + "'><v>" + std::to_string(i * 7 % 10000) + "</v></i>";
   }
   const Value document = parsed(text + "</r>");
   for (const char* query :
        {"count(for $a in //i, $b in //i where $a/v = $b/@k return $b)",
         "count(for $a in //i for $b in //i where $b/@k eq string($a/v) return $b)",
+        "count(for $a in //i, $b in //i where $b/v >= 0 and $a/v = $b/@k and $b return $b)",
+        "count(for $a in //i, $b in //i where $a/v >= 0 and $b/@k = $a/v return $b)",
         "count(for $a in //i return //i[@k = $a/v])",
         "count(for $a in //i return /r/i[v = $a/@k]/@k)",
         "count(let $all := //i for $a in $all return $all[v = $a/@k and @k])",
-        "count(for $a in 0 to 29999 return //i[v = $a])"}) {
-    EXPECT_EQ(answer(query, document), answer("30000")) << query;
+        "count(for $a in 0 to 9999 return //i[v = $a])"}) {
+    EXPECT_EQ(answer(query, document), answer("10000")) << query;
   }
 }
 
@@ -208,7 +213,6 @@ XQueryJoinCondition condition(XQueryRelation::Test test, bool negated = false,
   XQueryJoinCondition made;
   made.relation = {test, negated};
   made.isValueComparison = isValueComparison;
-  made.isWhole = true;
   return made;
 }
 
