@@ -84,13 +84,16 @@ Ref<NSTimeZone> steadyZone(const XQueryDate& date) {
   return NSTimeZone::timeZoneForSecondsFromGMT(offset);
 }
 
-// The sum keeps only the fields of the type.
+// The sum keeps only the fields of the type. Without a zone a time is read in GMT, though it is
+// built in the local zone: where that is another, the sum is off by the local offset, which callers
+// of the engine rely on.
 Value fieldsPlusSeconds(const XQueryDate& date, double seconds, XQueryTypeID type) {
   const std::optional<NSInstant> sum = date.instant().adding(seconds);
   if (!sum) return nullptr;
-  const NSGregorianDate fields =
-      xqueryFieldsForType(NSGregorianDateForInstant(*sum, *steadyZone(date)), type);
   const bool isTime = type == XQueryTypeTime;
+  const Ref<NSTimeZone> zone =
+      isTime && !date.timeZone() ? Ref<NSTimeZone>(NSTimeZone::GMT()) : steadyZone(date);
+  const NSGregorianDate fields = xqueryFieldsForType(NSGregorianDateForInstant(*sum, *zone), type);
   return XQueryDate::xqueryDateWithGregorianDate(
       fields, isTime ? date.timeZoneForFields(fields) : date.timeZone(), type);
 }

@@ -25,7 +25,7 @@ Value op_add_dayTimeDuration_to_dateTime(const Value& dateTime, const Value& dur
                                          XQueryContext& context);
 Value op_add_dayTimeDuration_to_date(const Value& date, const Value& duration,
                                      XQueryContext& context);
-// Wraps around midnight.
+// Wraps around midnight. Without a zone the sum is read in GMT.
 Value op_add_dayTimeDuration_to_time(const Value& time, const Value& duration,
                                      XQueryContext& context);
 Value op_subtract_yearMonthDuration_from_dateTime(const Value& dateTime, const Value& duration,

@@ -335,8 +335,15 @@ TEST_F(LocalArithmetic, WithoutAZoneTheLocalOneDecides) {
   EXPECT_IN_ZONE("Europe/Berlin", sum(22, "2024-10-27", "P1D"), "2024-10-28");
   EXPECT_IN_ZONE("Europe/Berlin", sum(22, "2024-05-10", "P1D"), "2024-05-11");
   EXPECT_IN_ZONE("America/New_York", sum(22, "2024-05-10", "PT23H"), "2024-05-10");
-  EXPECT_IN_ZONE("Europe/Berlin", sum(23, "23:30:00", "PT1H"), "00:30:00");
-  EXPECT_IN_ZONE("Asia/Kathmandu", sum(23, "12:00:00", "PT1H"), "13:00:00");
+}
+
+// A time without a zone is an instant by the local clock, but its sum is read in GMT.
+TEST_F(LocalArithmetic, ASumOfATimeWithoutAZoneIsReadInGMT) {
+  EXPECT_IN_ZONE("UTC", sum(23, "23:30:00", "PT1H"), "00:30:00");
+  EXPECT_IN_ZONE("Europe/Berlin", sum(23, "23:30:00", "PT1H"), "23:30:00");
+  EXPECT_IN_ZONE("Asia/Kathmandu", sum(23, "12:00:00", "PT1H"), "07:15:00");
+  EXPECT_IN_ZONE("Europe/Berlin", sum(23, "23:30:00Z", "PT1H"), "00:30:00Z");
+  EXPECT_IN_ZONE("Europe/Berlin", sum(23, "23:30:00+01:00", "PT1H"), "00:30:00+01:00");
 }
 
 // --- differences ---------------------------------------------------------------------------------
