@@ -8,9 +8,10 @@ find_package(ICU REQUIRED COMPONENTS uc i18n)
 pkg_check_modules(GMP REQUIRED IMPORTED_TARGET gmp)
 pkg_check_modules(CURL REQUIRED IMPORTED_TARGET libcurl)
 pkg_check_modules(TIDY REQUIRED IMPORTED_TARGET tidy)
+pkg_check_modules(PCRE2 REQUIRED IMPORTED_TARGET libpcre2-8)
 pkg_check_modules(URIPARSER REQUIRED IMPORTED_TARGET liburiparser)
 
 add_library(xquery_dependencies INTERFACE)
 target_link_libraries(xquery_dependencies INTERFACE
-  LibXml2::LibXml2 ICU::i18n ICU::uc PkgConfig::GMP PkgConfig::URIPARSER
-  PkgConfig::CURL PkgConfig::TIDY Threads::Threads)
+  LibXml2::LibXml2 ICU::i18n ICU::uc PkgConfig::GMP PkgConfig::PCRE2
+  PkgConfig::URIPARSER PkgConfig::CURL PkgConfig::TIDY Threads::Threads)

@@ -1,6 +1,7 @@
 #include "Eval/XQueryContextInternal.h"
 
 #include "Expr/XQueryJoinMemo.h"
+#include "Functions/XQueryRegExCache.h"
 #include "Platform/NSLog.h"
 #include "Platform/XMLTree.h"
 #include "Prolog/XQueryProlog.h"
@@ -32,6 +33,11 @@ XQueryContextInternal::XQueryContextInternal()
       _joinMemo(std::make_unique<XQueryJoinMemo>()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;
+
+XQueryRegExCache& XQueryContextInternal::regExCache() {
+  if (!_regExCache) _regExCache = std::make_unique<XQueryRegExCache>();
+  return *_regExCache;
+}
 
 NSObject* XQueryContextInternal::globalForQName(const XQueryQName& qName) const {
   const auto found = _globals.find(qName);

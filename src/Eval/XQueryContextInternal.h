@@ -21,6 +21,7 @@ namespace xquery {
 class XQueryDate;
 class XQueryJoinMemo;
 class XQueryProlog;
+class XQueryRegExCache;
 
 // Whether the error says that a limit of the engine was reached. Such an error ends the evaluation
 // even where others are passed over.
@@ -120,6 +121,8 @@ class XQueryContextInternal {
 
   // The tables that joins of this evaluation have made.
   XQueryJoinMemo& joinMemo() { return *_joinMemo; }
+  // The regular expressions compiled last.
+  XQueryRegExCache& regExCache();
 
   const XQueryLimits& limits() const { return _limits; }
   void setLimits(XQueryLimits limits) { _limits = std::move(limits); }
@@ -146,6 +149,7 @@ class XQueryContextInternal {
   XQueryProlog* _prolog = nullptr;
   std::shared_ptr<XQueryClient> _client;
   XQueryLimits _limits;
+  std::unique_ptr<XQueryRegExCache> _regExCache;
   Value _contextItem;
   int64_t _position = 0;
   int64_t _last = 0;

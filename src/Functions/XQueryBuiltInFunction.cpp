@@ -12,6 +12,7 @@
 #include "Functions/FunctionsNode.h"
 #include "Functions/FunctionsNumeric.h"
 #include "Functions/FunctionsQName.h"
+#include "Functions/FunctionsRegEx.h"
 #include "Functions/FunctionsSequence.h"
 #include "Functions/FunctionsString.h"
 #include "Functions/FunctionsStringMapping.h"
@@ -60,9 +61,9 @@ constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
     {FN, "lower-case", fn_lower_case},
     {FN, "translate", fn_translate},
     {FN, "escape-uri", fn_escape_uri},
-    {FN, "matches", nullptr},
-    {FN, "replace", nullptr},
-    {FN, "tokenize", nullptr},
+    {FN, "matches", fn_matches},
+    {FN, "replace", fn_replace},
+    {FN, "tokenize", fn_tokenize},
     {FN, "true", fn_true},
     {FN, "false", fn_false},
     {FN, "not", fn_not},
