@@ -135,17 +135,17 @@ Value fn_distinct_values(const Value* arguments, size_t count, XQueryContext& co
   const Value values = XQueryAtomization(arguments[0], context);
   const XQueryItemList items(values.get());
   XQueryValueSet met;
-  XQueryGatherer kept;
+  Items kept;
   for (size_t index = 0; index < items.count(); ++index) {
     checkWork();
     NSObject* item = items[index];
     // The text of an untyped item is the string's, so a repeated one needs no cast.
     if (!met.insert(*item)) continue;
-    kept.add(XQueryObjectTypeID(item) == XQueryTypeUntypedAtomic
-                 ? XQueryCastAsTypeForContext(item, XQueryTypeString, context)
-                 : Value(item));
+    kept.push_back(XQueryObjectTypeID(item) == XQueryTypeUntypedAtomic
+                       ? XQueryCastAsTypeForContext(item, XQueryTypeString, context)
+                       : Value(item));
   }
-  return kept.value();
+  return normalised(sequenceOf(std::move(kept)));
 }
 
 Value fn_insert_before(const Value* arguments, size_t count, XQueryContext& context) {

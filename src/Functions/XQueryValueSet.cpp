@@ -18,12 +18,12 @@ uint64_t keyOf(double value) {
 
 }  // namespace
 
-size_t XQueryValueSet::ExactHash::operator()(const NSDecimal& value) const {
-  if (value.isSmallInteger()) return std::hash<int64_t>()(value.smallInteger());
+uint64_t XQueryValueSet::ExactHash::operator()(const NSDecimal& value) const {
+  if (value.isSmallInteger()) return static_cast<uint64_t>(value.smallInteger());
   return std::hash<std::string>()(value.toString());
 }
 
-size_t XQueryValueSet::ValueHash::operator()(const NSObject* value) const {
+uint64_t XQueryValueSet::ValueHash::operator()(const NSObject* value) const {
   return XQueryObjectHash(*value);
 }
 
@@ -32,10 +32,9 @@ bool XQueryValueSet::ValueEqual::operator()(const NSObject* a, const NSObject* b
 }
 
 bool XQueryValueSet::insert(const NSObject& value) {
-  if (const auto* string = dyn_cast<NSString>(&value))
-    return _strings.insert(string->view()).second;
+  if (const auto* string = dyn_cast<NSString>(&value)) return _strings.insert(string->view());
   if (const auto* number = dyn_cast<NSNumber>(&value)) return insertNumber(*number);
-  return _others.insert(&value).second;
+  return _others.insert(&value);
 }
 
 bool XQueryValueSet::insertNumber(const NSNumber& number) {
@@ -48,16 +47,16 @@ bool XQueryValueSet::insertNumber(const NSNumber& number) {
 
 bool XQueryValueSet::insertFloating(double value) {
   if (_floating.empty()) {
-    for (const NSDecimal& exact : _exact) _exactDoubles.insert(keyOf(exact.doubleValue()));
+    for (const auto& exact : _exact) _exactDoubles.insert(keyOf(exact.key.doubleValue()));
   }
   const uint64_t key = keyOf(value);
-  return !_exactDoubles.contains(key) && _floating.insert(key).second;
+  return !_exactDoubles.contains(key) && _floating.insert(key);
 }
 
 bool XQueryValueSet::insertExact(NSDecimal value) {
-  if (_floating.empty()) return _exact.insert(std::move(value)).second;
+  if (_floating.empty()) return _exact.insert(std::move(value));
   const uint64_t key = keyOf(value.doubleValue());
-  if (_floating.contains(key) || !_exact.insert(std::move(value)).second) return false;
+  if (_floating.contains(key) || !_exact.insert(std::move(value))) return false;
   _exactDoubles.insert(key);
   return true;
 }

@@ -16,13 +16,13 @@
 // one double from landing in one bucket.
 #pragma once
 
+#include "Functions/FlatSet.h"
 #include "xquery/Number.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
-#include <cstddef>
 #include <cstdint>
-#include <unordered_set>
+#include <functional>
 
 namespace xquery {
 
@@ -33,16 +33,19 @@ class XQueryValueSet {
 
  private:
   struct TextHash {
-    size_t operator()(NSStringView text) const { return text.hash(); }
+    uint64_t operator()(NSStringView text) const { return text.hash(); }
+  };
+  struct TextEqual {
+    bool operator()(NSStringView a, NSStringView b) const { return a.equals(b); }
   };
   struct ExactHash {
-    size_t operator()(const NSDecimal& value) const;
+    uint64_t operator()(const NSDecimal& value) const;
   };
   struct ExactEqual {
     bool operator()(const NSDecimal& a, const NSDecimal& b) const { return a.compare(b) == 0; }
   };
   struct ValueHash {
-    size_t operator()(const NSObject* value) const;
+    uint64_t operator()(const NSObject* value) const;
   };
   struct ValueEqual {
     bool operator()(const NSObject* a, const NSObject* b) const;
@@ -52,11 +55,15 @@ class XQueryValueSet {
   bool insertFloating(double value);
   bool insertExact(NSDecimal value);
 
-  std::unordered_set<NSStringView, TextHash> _strings;
-  std::unordered_set<NSDecimal, ExactHash, ExactEqual> _exact;
-  std::unordered_set<uint64_t> _floating;      // doubles by their bits
-  std::unordered_set<uint64_t> _exactDoubles;  // complete once `_floating` holds anything
-  std::unordered_set<const NSObject*, ValueHash, ValueEqual> _others;
+  struct BitsHash {
+    uint64_t operator()(uint64_t bits) const { return bits; }
+  };
+
+  FlatSet<NSStringView, TextHash, TextEqual> _strings;
+  FlatSet<NSDecimal, ExactHash, ExactEqual> _exact;
+  FlatSet<uint64_t, BitsHash, std::equal_to<>> _floating;      // doubles by their bits
+  FlatSet<uint64_t, BitsHash, std::equal_to<>> _exactDoubles;  // complete once there is a double
+  FlatSet<const NSObject*, ValueHash, ValueEqual> _others;
 };
 
 }  // namespace xquery
