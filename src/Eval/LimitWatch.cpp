@@ -29,48 +29,63 @@ int64_t mostBytes(const XQueryLimits& limits, int64_t inUse) {
   return static_cast<int64_t>(static_cast<uint64_t>(inUse) + *limits.memoryCeiling);
 }
 
+// The innermost on this thread.
+thread_local XQueryLimitWatch* innermost = nullptr;
+
 }  // namespace
 
 XQueryLimitWatch::XQueryLimitWatch(XQueryContext& context)
     : _context(context),
       _limits(context.contextLimits()),
       _deadline(deadlineOf(_limits)),
-      _outer(workMeter) {
+      _around(innermost),
+      _outer(workMeter),
+      _mostBytes(mostBytes(_limits, workMeter.valueBytes)) {
   WorkMeter& meter = workMeter;
   meter.stepsLeft = stepsBetweenLooks();
-  meter.mostValueBytes = mostBytes(_limits, meter.valueBytes);
+  meter.mostValueBytes = std::min(_mostBytes, _outer.mostValueBytes);
   meter.wasRefused = false;
   meter.watcher = this;
+  innermost = this;
 }
 
 XQueryLimitWatch::~XQueryLimitWatch() {
   WorkMeter& meter = workMeter;
+  const bool outerRefused = meter.wasRefused && _outer.mostValueBytes <= _mostBytes;
   meter.stepsLeft = _outer.stepsLeft;
   meter.mostValueBytes = _outer.mostValueBytes;
-  meter.wasRefused = _outer.wasRefused;
+  meter.wasRefused = _outer.wasRefused || outerRefused;
   meter.watcher = _outer.watcher;
+  innermost = _around;
 }
 
 int64_t XQueryLimitWatch::stepsBetweenLooks() const {
   const bool isLimited = _deadline || _limits.cancelled || _limits.memoryCeiling;
-  return isLimited ? stepsPerLook : WorkMeter::manySteps;
+  if (isLimited) return stepsPerLook;
+  return _around ? _around->stepsBetweenLooks() : WorkMeter::manySteps;
 }
 
-const XQueryErrorText<>* XQueryLimitWatch::reachedLimit() const {
+const XQueryErrorText<>* XQueryLimitWatch::ownLimit() const {
   if (_limits.cancelled && _limits.cancelled->load(std::memory_order_relaxed)) {
     return &XQueryErrors::evaluationCancelled;
   }
   if (_deadline && Clock::now() >= *_deadline) return &XQueryErrors::deadlinePassed;
-  const WorkMeter& meter = workMeter;
-  const bool exceedsCeiling = meter.wasRefused || meter.valueBytes > meter.mostValueBytes;
-  return exceedsCeiling ? &XQueryErrors::memoryCeilingReached : nullptr;
+  return workMeter.valueBytes > _mostBytes ? &XQueryErrors::memoryCeilingReached : nullptr;
+}
+
+const XQueryErrorText<>* XQueryLimitWatch::reachedLimit() {
+  if (!_reached && workMeter.wasRefused && workMeter.watcher == this) {
+    _reached = &XQueryErrors::memoryCeilingReached;
+  }
+  if (!_reached) _reached = ownLimit();
+  if (!_reached && _around) _reached = _around->reachedLimit();
+  return _reached;
 }
 
 void XQueryLimitWatch::lookAtWork() {
   workMeter.stepsLeft = stepsBetweenLooks();
   if (_isRaising) return;  // making the error is work, too
-  if (!_reached) _reached = reachedLimit();
-  if (!_reached) return;
+  if (!reachedLimit()) return;
   _isRaising = true;
   const Ref<XQueryError> error = _reached->error();
   _isRaising = false;
@@ -80,6 +95,12 @@ void XQueryLimitWatch::lookAtWork() {
 
 const XQueryErrorText<>& XQueryLimitWatch::allocationFailure() const {
   return workMeter.wasRefused ? XQueryErrors::memoryCeilingReached : XQueryErrors::outOfMemory;
+}
+
+Ref<XQueryContext> XQueryNestedContext(const XQueryContext& outer) {
+  auto inner = XQueryContext::xqueryContext();
+  inner->contextSetLoading(outer.contextLoading());
+  return inner;
 }
 
 }  // namespace xquery

@@ -1,4 +1,18 @@
 // Watches one evaluation on its thread and ends it at the limits of its context.
+//
+// Evaluations nest: a query may have another one compiled and evaluated, and a loader or client of
+// the host may evaluate something of its own. Whatever runs on the thread inside an evaluation is
+// part of its work, so it also ends at the limits of those around it: the earliest deadline, any
+// flag, and the least memory left count. This needs nothing of whoever begins the inner one, but
+// for what is not a limit:
+//
+//   const auto inner = XQueryNestedContext(outer);         // loads what the outer one may load
+//   const auto query = XQuery::xqueryWithSource(text, inner->contextLoading());
+//   inner->evaluateXQuery(*query, {}, item, &error);       // its error may be passed over
+//
+// Compiling is watched as well and throws, once a limit is reached, what ends the outer one. An
+// inner evaluation that reaches a limit of an outer one gives back the error like any other; passed
+// over or not, the outer one ends at its next look.
 #pragma once
 
 #include "Platform/WorkMeter.h"
@@ -10,8 +24,7 @@ namespace xquery {
 
 class XQueryLimitWatch final : public WorkWatcher {
  public:
-  // From here on, until it is destroyed, the thread works for this evaluation. An evaluation that
-  // another one on the thread brought about (by calling its host) is watched by its own limits.
+  // From here on, until it is destroyed, the thread works for this evaluation.
   explicit XQueryLimitWatch(XQueryContext& context);
   ~XQueryLimitWatch();
   XQueryLimitWatch(const XQueryLimitWatch&) = delete;
@@ -24,15 +37,21 @@ class XQueryLimitWatch final : public WorkWatcher {
   const XQueryErrorText<>& allocationFailure() const;
 
  private:
-  const XQueryErrorText<>* reachedLimit() const;
+  const XQueryErrorText<>* ownLimit() const;
+  const XQueryErrorText<>* reachedLimit();
   int64_t stepsBetweenLooks() const;
 
   XQueryContext& _context;
   const XQueryLimits _limits;  // a copy: the host may set others meanwhile
-  std::optional<std::chrono::steady_clock::time_point> _deadline;
-  const WorkMeter _outer;  // what was in force before
+  const std::optional<std::chrono::steady_clock::time_point> _deadline;
+  XQueryLimitWatch* const _around;  // the evaluation that this one is part of, if any
+  const WorkMeter _outer;           // what was in force before
+  const int64_t _mostBytes;         // by the limits of this one alone
   const XQueryErrorText<>* _reached = nullptr;
   bool _isRaising = false;
 };
+
+// A context for an evaluation that is part of another one: a new one that loads by the same rules.
+[[nodiscard]] Ref<XQueryContext> XQueryNestedContext(const XQueryContext& outer);
 
 }  // namespace xquery

@@ -45,6 +45,7 @@ void XQueryCheckStackClosely(XQueryContext& context) {
 }
 
 bool XQueryCheckStack(XQueryProlog& prolog) {
+  checkWork();
   if (XQueryStackHasRoom()) return true;
   const auto& errors = prolog.errors();
   if (errors.empty() || !(errors.back()->msg()->view() == XQueryErrors::nestedTooDeeply.text)) {

@@ -28,7 +28,8 @@ void XQueryCheckStackClosely(XQueryContext& context);
     XQueryCheckStackClosely(context);
   }
 }
-// Nesting alone, while binding: adds the error to the prolog (once) and answers false.
+// The same while binding. Nesting too deep adds the error to the prolog (once) and answers false; a
+// limit that is reached ends the evaluation that the binding is part of, if any.
 bool XQueryCheckStack(XQueryProlog& prolog);
 
 }  // namespace xquery

@@ -153,7 +153,10 @@ Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
     watch.lookAtWork();
     XQuerySetConstants(constants, *compiled.prolog(), *this);
     XQueryEvaluateDeclarations(*compiled.prolog(), *this);
-    return compiled.body() ? compiled.body()->evaluateWithContext(*this) : Value();
+    Value result = compiled.body() ? compiled.body()->evaluateWithContext(*this) : Value();
+    // Nor is a result of more than it may take handed out because it was made in a few steps.
+    watch.lookAtWork();
+    return result;
   } catch (const NSException&) {
     return _private->error();
   } catch (const std::bad_alloc&) {

@@ -5,7 +5,8 @@
 // XQueryWalkAlongAxis visits the same nodes in the order in which predicates count them, nearest
 // first for preceding too. The visitor answers whether the walk goes on. Nothing is allocated,
 // except that the preceding axis in document order keeps the list of the node's ancestors. A walk
-// may be ended at a limit of the evaluation, by an exception.
+// may be ended at a limit of the evaluation, by an exception. The visitor may be copied: what it
+// changes it refers to.
 #pragma once
 
 #include "Expr/XQueryPath.h"
@@ -32,8 +33,9 @@ NSXMLNode* XQueryLastInSubtree(NSXMLNode* node);
 
 // Visits `first` and each node after it in document order, up to (excluding) `stop`.
 template <class Visit>
-void XQueryWalkNodes(NSXMLNode* first, const NSXMLNode* stop, Visit& visit) {
+void XQueryWalkNodes(NSXMLNode* first, const NSXMLNode* stop, const Visit& visitor) {
   WorkPacer pacer;
+  Visit visit = visitor;  // whose parts can then be in registers
   for (NSXMLNode* node = first; node && node != stop; node = node->nextNode()) {
     pacer.turn();
     if (!visit(node)) return;

@@ -206,12 +206,25 @@ void XQueryAxisStep::enter(NSXMLNode* node, XQueryPathRun& run) const {
   if (run.setsEveryFocus || testMayRaise()) run.context._internal().setContextItem(node, 0);
 }
 
-// Hands each node on as it is found.
+// Hands each node on as it is found. What the test asks of a node is copied into the walk, where it
+// stays in registers; names are what is walked for most.
 void XQueryAxisStep::stream(int axis, NSXMLNode* node, XQueryPathRun& run) const {
   XQueryNodeTest test(_expr.get(), run);
+  if (const NSXMLExpandedName* name = test.onlyName()) {
+    streamMatching(axis, node, run,
+                   [name](const NSXMLNode* found) { return found->expandedName() == name; });
+  } else {
+    streamMatching(axis, node, run,
+                   [&test](const NSXMLNode* found) { return test.matches(found); });
+  }
+}
+
+template <class Matches>
+void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& run,
+                                    Matches matches) const {
   const XQueryStep* next = _next.get();
-  const auto handOn = [&](NSXMLNode* found) {
-    if (!test.matches(found)) return true;
+  const auto handOn = [matches, next, &run](NSXMLNode* found) {
+    if (!matches(found)) return true;
     if (next) {
       next->processNode(found, run);
     } else {

@@ -124,6 +124,8 @@ class XQueryAxisStep : public XQueryStep {
 
   void enter(NSXMLNode* node, XQueryPathRun& run) const;
   void stream(int axis, NSXMLNode* node, XQueryPathRun& run) const;
+  template <class Matches>
+  void streamMatching(int axis, NSXMLNode* node, XQueryPathRun& run, Matches matches) const;
   void filter(NSXMLNode* node, XQueryPathRun& run) const;
   size_t collect(NSXMLNode* node, std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const;
   bool isDescendantShorthand() const;

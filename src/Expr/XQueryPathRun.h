@@ -81,6 +81,9 @@ class XQueryNodeTest {
     if (_name) return node->expandedName() == _name;
     return !_askFurther || matchesFurther(node);
   }
+  // The name that an element or attribute needs when it needs nothing else, and other nodes cannot
+  // have; null for another test.
+  const NSXMLExpandedName* onlyName() const { return _name; }
 
  private:
   void setNameTest(const XQueryNameTest& test);

@@ -3,9 +3,11 @@
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
 #include "Platform/NSLog.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 
 #include <algorithm>
+#include <chrono>
 #include <climits>
 #include <cstring>
 #include <exception>
@@ -14,7 +16,7 @@
 namespace xquery {
 namespace {
 
-std::mutex sXQueryParserLock;
+std::timed_mutex sXQueryParserLock;
 XQueryParser* sXQueryParserCurrent = nullptr;
 unsigned sXQueryParserSetterFlags = 0;
 
@@ -59,7 +61,11 @@ Ref<NSString> currentSourceLine() {
 
 NSObject* yyparse_result = nullptr;
 
-XQueryParser::Session::Session(XQueryParser& parser) : _lock(sXQueryParserLock), _parser(parser) {
+// An evaluation that compiles a query may be ended while it waits for another thread's parse.
+XQueryParser::Session::Session(XQueryParser& parser)
+    : _lock(sXQueryParserLock, std::defer_lock), _parser(parser) {
+  constexpr std::chrono::milliseconds betweenLooks(20);
+  while (!_lock.try_lock_for(betweenLooks)) lookAtWork();
   sXQueryParserCurrent = &parser;
   sXQueryParserSetterFlags = 0;
 }
@@ -94,8 +100,10 @@ void XQueryParser::parse() {
     // A failed run may leave what an unfinished rule had built.
     if (XQparse() == 0) _parsedModule = cast<XQueryParsedModule>(yyparse_result);
   } catch (const NSException&) {
-    // The error was recorded before it was raised.
+    // The scanner's own error was recorded before it was raised; any other ends the evaluation that
+    // the parse is part of.
     _parsedModule = nullptr;
+    if (_errors.empty()) throw;
   } catch (const std::bad_alloc&) {
     _parsedModule = nullptr;
     setError(XQueryErrors::outOfMemory.error());
@@ -133,6 +141,8 @@ size_t XQueryParser::remainingBytes() {
 
 size_t XQueryParser::readChars(size_t maxBytes, char* toBuffer) {
   const size_t count = std::min(maxBytes, remainingBytes());
+  constexpr size_t bytesPerStep = 64;
+  checkWork(count / bytesPerStep);
   std::memcpy(toBuffer, _utf8String.data() + _position, count);
   _position += count;
   return count;

@@ -66,7 +66,7 @@ class XQueryParser : public NSCounted {
     Session& operator=(const Session&) = delete;
 
    private:
-    std::unique_lock<std::mutex> _lock;
+    std::unique_lock<std::timed_mutex> _lock;
     XQueryParser& _parser;
   };
   // A parser that has not parsed, for driving the scanner alone.

@@ -98,6 +98,8 @@ void Transfer::configure() {
   curl_easy_setopt(easy, CURLOPT_FOLLOWLOCATION, 0L);
   curl_easy_setopt(easy, CURLOPT_CONNECTTIMEOUT_MS, milliseconds(_request.connectTimeout));
   curl_easy_setopt(easy, CURLOPT_TIMEOUT_MS, milliseconds(_request.totalTimeout));
+  // A name that is still being looked up is not waited for when the transfer is given up.
+  curl_easy_setopt(easy, CURLOPT_QUICK_EXIT, 1L);
   // Signals are the host's.
   curl_easy_setopt(easy, CURLOPT_NOSIGNAL, 1L);
   curl_easy_setopt(easy, CURLOPT_USERAGENT, "libxquery");

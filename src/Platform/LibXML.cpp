@@ -22,8 +22,10 @@ namespace {
 
 // One parse. Exceptions do not cross libxml2's C frames: a callback that fails notes the failure
 // and stops the parser, and every callback that is still called afterwards does nothing. Only the
-// end of an evaluation that the parse is part of is thrown on, when libxml2 has returned. The
-// content of an entity is parsed by an inner parser of libxml2's, which calls the same functions.
+// end of an evaluation that the parse is part of is thrown on, when libxml2 has returned: it is
+// looked for when input is read and when entities and defaults, which need no reading, add to the
+// document. The content of an entity is parsed by an inner parser of libxml2's, which calls the
+// same functions.
 class Parse {
  public:
   Parse(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error)
@@ -38,6 +40,7 @@ class Parse {
   void fail(const char* message);
   void failAt(const char* message, int64_t line, int64_t column);
   void note(const char* message, int64_t line, int64_t column);  // the first failure counts
+  void end(std::exception_ptr exception);                        // counts as a failure
   bool hasReadAll();
   bool isTagTooLong() const;
   bool mayAdd(size_t bytes);
@@ -105,6 +108,11 @@ void Parse::note(const char* message, int64_t line, int64_t column) {
   _error.column = column;
 }
 
+void Parse::end(std::exception_ptr exception) {
+  if (!_ended) _ended = std::move(exception);
+  note("the evaluation has ended", 0, 0);
+}
+
 void Parse::failAt(const char* message, int64_t line, int64_t column) {
   note(message, line, column);
   xmlStopParser(_parser);
@@ -124,6 +132,9 @@ void Parse::guarded(Function function) {
     fail(stop.message);
   } catch (const std::bad_alloc&) {
     fail(outOfMemory);
+  } catch (...) {
+    end(std::current_exception());
+    xmlStopParser(_parser);
   }
 }
 
@@ -148,8 +159,7 @@ int Parse::readInput(void* self, char* buffer, int size) {
   } catch (const std::bad_alloc&) {
     parse.note(outOfMemory, 0, 0);
   } catch (...) {
-    parse._ended = std::current_exception();
-    parse.note("the evaluation has ended", 0, 0);
+    parse.end(std::current_exception());
   }
   if (count < 0) {
     parse.note("the input cannot be read", 0, 0);
@@ -205,12 +215,13 @@ xmlEntityPtr Parse::permitted(xmlEntityPtr entity) {
     fail("external entities are not read");
     return nullptr;
   }
-  if (entity->etype != XML_INTERNAL_PREDEFINED_ENTITY &&
-      !mayAdd(static_cast<size_t>(entity->length) + LibXMLReferenceCost)) {
-    fail(tooMuchText);
-    return nullptr;
-  }
-  return entity;
+  if (entity->etype == XML_INTERNAL_PREDEFINED_ENTITY) return entity;
+  const size_t bytes = static_cast<size_t>(entity->length) + LibXMLReferenceCost;
+  guarded([&] {
+    if (!mayAdd(bytes)) throw LibXMLStop{tooMuchText};
+    checkWork(bytes / bytesPerStep + 1);
+  });
+  return _failed ? nullptr : entity;
 }
 
 xmlEntityPtr Parse::getEntity(void* self, const xmlChar* name) {
@@ -260,6 +271,7 @@ void Parse::startElement(void* self, const xmlChar* localName, const xmlChar* pr
   parse._namespaceEntries = parse._parser->nsNr;
   parse.guarded([&] {
     if (!parse.mayAddDefaults(declared, given, defaultedCount)) throw LibXMLStop{tooMuchText};
+    checkWork();
     parse._handler.startElement({localName, prefix, URI}, declared, given);
   });
 }

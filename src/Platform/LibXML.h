@@ -85,9 +85,10 @@ constexpr size_t LibXMLAddedFactor = 20;
 constexpr size_t LibXMLReferenceCost = 32;
 constexpr size_t LibXMLAttributeCost = 16;
 
-// libxml2 compares every attribute of a start tag with every other, and every declaration too, so
-// that a tag of a million would keep it busy for minutes. Somewhat more than this many are refused.
-constexpr int LibXMLMostAttributes = 45000;
+// libxml2 compares every attribute of a start tag with every other, and every declaration too, and
+// cannot be interrupted meanwhile: a tag of a million would keep it busy for minutes. Somewhat more
+// than this many, some hundredths of a second of work, are refused.
+constexpr int LibXMLMostAttributes = 12000;
 
 // Whether the document was well formed; else `error` says what is wrong, and where.
 bool parseWithLibXML(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error);

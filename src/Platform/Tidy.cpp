@@ -10,8 +10,11 @@
 
 #include "Platform/HTMLText.h"
 #include "Platform/UTF8.h"
+#include "Platform/WorkMeter.h"
 
 #include <algorithm>
+#include <atomic>
+#include <cerrno>
 #include <csetjmp>
 #include <cstdint>
 #include <cstdlib>
@@ -36,8 +39,8 @@ constexpr size_t mostMemoryPerByte = 64;
 // Of the processor; ten times what a large document takes.
 constexpr double mostSeconds = 2;
 constexpr double mostSecondsPerByte = 1e-6;
-// libtidy compares every attribute of a tag with every other.
-constexpr size_t mostAttributes = 20'000;
+// libtidy compares every attribute of a tag with every other, asking for no memory meanwhile.
+constexpr size_t mostAttributes = 5'000;
 
 // --- the allocator -------------------------------------------------------------------------------
 
@@ -54,6 +57,8 @@ class Allocator {
 
   TidyAllocator* forTidy() { return &_shell.tidy; }
   const char* failure() const { return _failure; }
+  // From another thread: the next request for memory is a limit reached.
+  void abandon() { _isAbandoned.store(true, std::memory_order_relaxed); }
   // Calls `function`, which is left by a jump when a limit is reached: on its way to libtidy
   // nothing must need its destructor. Whether it came to its end.
   template <class Function>
@@ -94,6 +99,7 @@ class Allocator {
     std::longjmp(_exit, 1);
   }
   void check(size_t more) {
+    if (_isAbandoned.load(std::memory_order_relaxed)) leave("nobody waits for the HTML");
     if (_stackStart - here() > usableStack) leave("HTML nested too deeply");
     if (more > _mostBytes - std::min(_bytes, _mostBytes)) leave("HTML takes too much memory");
     constexpr unsigned betweenClocks = 256;
@@ -132,6 +138,7 @@ class Allocator {
   const double _mostSeconds;
   unsigned _calls = 0;
   uintptr_t _stackStart = 0;
+  std::atomic<bool> _isAbandoned = false;
   const char* _failure = "";
   std::jmp_buf _exit;
 };
@@ -385,12 +392,14 @@ class Conversion {
  public:
   explicit Conversion(std::string HTML) : _HTML(std::move(HTML)), _allocator(_HTML.size()) {}
 
-  // On a thread of its own; answers whether there is one to be had.
+  // On a thread of its own; answers whether there is one to be had. The evaluation that waits for
+  // it may be ended meanwhile, by an exception.
   bool runOnOwnStack();
   std::optional<std::string> result(std::string& failure);
 
  private:
   static void* start(void* self);
+  bool waitFor(pthread_t thread);
   void run();
   void configure();
 
@@ -456,6 +465,30 @@ void* Conversion::start(void* self) {
   return nullptr;
 }
 
+// The thread works on this object, so it has ended whenever this returns or throws.
+bool Conversion::waitFor(pthread_t thread) {
+  constexpr long lookNanoseconds = 10'000'000;
+  constexpr long second = 1'000'000'000;
+  try {
+    for (;;) {
+      timespec time = {};
+      ::clock_gettime(CLOCK_REALTIME, &time);
+      time.tv_nsec += lookNanoseconds;
+      if (time.tv_nsec >= second) {
+        time.tv_sec += 1;
+        time.tv_nsec -= second;
+      }
+      const int failure = pthread_timedjoin_np(thread, nullptr, &time);
+      if (failure != ETIMEDOUT) return failure == 0;
+      lookAtWork();
+    }
+  } catch (...) {
+    _allocator.abandon();
+    pthread_join(thread, nullptr);
+    throw;
+  }
+}
+
 bool Conversion::runOnOwnStack() {
   pthread_attr_t attributes;
   pthread_t thread;
@@ -463,7 +496,7 @@ bool Conversion::runOnOwnStack() {
   pthread_attr_setstacksize(&attributes, stackSize);
   const int failure = pthread_create(&thread, &attributes, &Conversion::start, this);
   pthread_attr_destroy(&attributes);
-  return failure == 0 && pthread_join(thread, nullptr) == 0;
+  return failure == 0 && waitFor(thread);
 }
 
 std::optional<std::string> Conversion::result(std::string& failure) {
