@@ -123,6 +123,13 @@ void decorateWithBaseURI(const NSArray& items, const XQueryContextInternal& cont
                                    NSStringView::ascii("http://www.w3.org/XML/1998/namespace")));
 }
 
+// Other errors leave the variables and the focus as they were when they arose. A limit may have
+// been reached because of what those hold.
+void dropValues(XQueryContextInternal& context, const Value& formerContextItem) {
+  context._setInScopeVariables(nullptr);
+  context.setContextItem(formerContextItem, 1);
+}
+
 }  // namespace
 
 Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryConstants& constants,
@@ -148,6 +155,7 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
 Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
                                     const XQueryConstants& constants) {
   XQueryLimitWatch watch(*this);
+  const Value contextItem = _private->contextItem();
   try {
     // A limit that is reached already ends the shortest evaluation as well.
     watch.lookAtWork();
@@ -158,8 +166,10 @@ Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
     watch.lookAtWork();
     return result;
   } catch (const NSException&) {
+    if (XQueryIsLimit(_private->error().get())) dropValues(*_private, contextItem);
     return _private->error();
   } catch (const std::bad_alloc&) {
+    dropValues(*_private, contextItem);
     return watch.allocationFailure().error();
   } catch (const std::length_error&) {
     // Only decimals throw it.

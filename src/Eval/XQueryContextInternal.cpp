@@ -3,6 +3,7 @@
 #include "Expr/XQueryJoinMemo.h"
 #include "Functions/XQueryRegExCache.h"
 #include "Platform/NSLog.h"
+#include "Platform/WorkMeter.h"
 #include "Platform/XMLTree.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryDate.h"
@@ -87,7 +88,9 @@ void XQueryContextInternal::popInScopeNamespaces() {
 
 Ref<NSString> XQueryContextInternal::firstPrefixForNamespace(const Ref<NSString>& URI) const {
   if (!URI) return {};
+  WorkPacer pacer;
   for (auto entry = _inScopeNamespaces.rbegin(); entry != _inScopeNamespaces.rend(); ++entry) {
+    pacer.turn();
     for (const auto& node : *entry) {
       if (node->textView() == URI->view()) return node->name();
     }
@@ -101,7 +104,9 @@ Ref<NSString> XQueryContextInternal::firstPrefixForNamespace(const Ref<NSString>
 }
 
 const NSXMLNode* XQueryContextInternal::inScopeNamespaceForPrefix(NSStringView prefix) const {
+  WorkPacer pacer;
   for (auto entry = _inScopeNamespaces.rbegin(); entry != _inScopeNamespaces.rend(); ++entry) {
+    pacer.turn();
     for (const auto& node : *entry) {
       if (node->nameView() == prefix) return node.get();
     }

@@ -1,5 +1,6 @@
 // The documents and raw bodies of one context.
 #include "Eval/XQueryContextInternal.h"
+#include "Platform/WorkMeter.h"
 #include "xquery/XMLNode.h"
 
 #include <algorithm>
@@ -46,6 +47,8 @@ Value XQueryContextInternal::XQueryDocumentForURL(const Ref<NSURL>& URL) {
       result = document;
     }
   }
+  // A document that a limit kept from being made is not missing.
+  lookAtWork();
   _documentCache.insert_or_assign(URL, result);
   return result;
 }

@@ -114,7 +114,11 @@ template <class Before>
 void sortSeveralTrees(std::vector<Value>& nodes, Before before) {
   std::vector<Placed> placed = placedNodes(nodes);
   stableMergeSort(placed, before);
-  for (size_t i = 0; i < nodes.size(); ++i) nodes[i] = std::move(placed[i].node);
+  WorkPacer pacer;
+  for (size_t i = 0; i < nodes.size(); ++i) {
+    pacer.turn();
+    nodes[i] = std::move(placed[i].node);
+  }
 }
 
 void sortByOrderNumber(std::vector<Value>& nodes) {
@@ -124,16 +128,20 @@ void sortByOrderNumber(std::vector<Value>& nodes) {
   };
   std::vector<Numbered> numbered;
   numbered.reserve(nodes.size());
+  WorkPacer pacer;
   for (Value& node : nodes) {
+    pacer.turn();
     const uint32_t number = nodeOf(node)->orderNumber();
     numbered.push_back({number, std::move(node)});
   }
-  WorkPacer pacer;
   std::sort(numbered.begin(), numbered.end(), [&pacer](const Numbered& a, const Numbered& b) {
     pacer.turn();
     return a.number < b.number;
   });
-  for (size_t i = 0; i < nodes.size(); ++i) nodes[i] = std::move(numbered[i].node);
+  for (size_t i = 0; i < nodes.size(); ++i) {
+    pacer.turn();
+    nodes[i] = std::move(numbered[i].node);
+  }
 }
 
 }  // namespace

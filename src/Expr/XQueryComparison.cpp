@@ -5,6 +5,7 @@
 #include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
 #include "Expr/XQueryUntypedText.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryDate.h"
@@ -291,6 +292,7 @@ Value XQueryGeneralComparisonPlainly(int type, const Value& left, const Value& r
   const int code = type + (XQueryOperatorEq - XQueryOperatorEqual);
   for (size_t i = 0; i < leftItems.count(); ++i) {
     for (size_t j = 0; j < rightItems.count(); ++j) {
+      checkWork();
       const XQueryPairTargets targets = XQueryGeneralComparisonTargets(
           XQueryObjectTypeID(leftItems[i]), XQueryObjectTypeID(rightItems[j]));
       const Value x = castTo(leftItems[i], targets.left, context);

@@ -64,6 +64,7 @@ void XQueryContent::addNode(NSXMLNode& node) {
       return;
     case Kind::Document:
       for (NSXMLNode* child = node.firstChild(); child; child = child->nextSibling()) {
+        checkWork();
         addNode(*child);
       }
       break;

@@ -1,6 +1,7 @@
 #include "Expr/XQueryContentText.h"
 
 #include "Expr/XQuerySequence.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "xquery/XMLNode.h"
@@ -29,6 +30,7 @@ bool XQueryAppendText(const Value& value, NSMutableString& text, XQueryContext& 
   const Value atomized = XQueryAtomization(value, context);
   const XQueryItemList items(atomized.get());
   for (size_t index = 0; index < items.count(); ++index) {
+    checkWork();
     if (index > 0) text.append(u' ');
     XQueryAppendAtomic(items[index], text, context);
   }

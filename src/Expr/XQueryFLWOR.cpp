@@ -211,7 +211,11 @@ void XQueryFLWORExpr::addSortItems(Value value, XQuerySortList& toList,
   const Value flat = flattened(std::move(value));
   const XQueryItemList items(flat.get());
   if (items.count() == 0) toList.keys.resize(sortInfo);
-  for (size_t i = 0; i < items.count(); ++i) toList.items.push_back({items[i], sortInfo, i});
+  WorkPacer pacer;
+  for (size_t i = 0; i < items.count(); ++i) {
+    pacer.turn();
+    toList.items.push_back({items[i], sortInfo, i});
+  }
 }
 
 Value XQueryFLWORExpr::evaluateWithContext(XQueryContext& context) const {
@@ -226,7 +230,9 @@ Value XQueryFLWORExpr::evaluateWithContext(XQueryContext& context) const {
   }
   auto sorted = XQuerySequence::sequence();
   sorted->objects().reserve(results.sortList.items.size());
+  WorkPacer pacer;
   for (XQuerySortItem& item : results.sortList.items) {
+    pacer.turn();
     sorted->objects().push_back(std::move(item.value));
   }
   return normalised(std::move(sorted));

@@ -259,7 +259,9 @@ class RankedOrder {
   std::vector<Entry> entries() const {
     std::vector<Entry> entries;
     entries.reserve(_list.items.size());
+    WorkPacer pacer;
     for (size_t i = 0; i < _list.items.size(); ++i) {
+      pacer.turn();
       entries.push_back({_columns.empty() ? lowestRank : _columns.front().rank(i), i});
     }
     return entries;
@@ -295,7 +297,11 @@ bool XQueryFLWORSort(XQuerySortList& list, bool ascending, bool emptyLeast) {
   stableMergeSort(entries, [&](const Entry& a, const Entry& b) { return ranked.isBefore(a, b); });
   std::vector<XQuerySortItem> sorted;
   sorted.reserve(entries.size());
-  for (const Entry& entry : entries) sorted.push_back(std::move(list.items[entry.index]));
+  WorkPacer pacer;
+  for (const Entry& entry : entries) {
+    pacer.turn();
+    sorted.push_back(std::move(list.items[entry.index]));
+  }
   list.items.swap(sorted);
   return order.isComparable();
 }

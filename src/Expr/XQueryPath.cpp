@@ -25,6 +25,7 @@
 #include "Expr/XQueryPathRun.h"
 #include "Expr/XQueryReads.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 
@@ -35,7 +36,9 @@ namespace {
 
 bool allAreNodes(const Value& items) {
   const XQueryItemList list(items.get());
+  WorkPacer pacer;
   for (size_t i = 0; i < list.count(); ++i) {
+    pacer.turn();
     if (!XQueryIsNode(list[i])) return false;
   }
   return true;
@@ -252,7 +255,11 @@ void XQueryAxisStep::filter(NSXMLNode* node, XQueryPathRun& run) const {
   if (_next) {
     _next->processNodes(nodes, run);
   } else {
-    for (NSXMLNode* found : nodes) run.results.addNode(found, run.context);
+    WorkPacer pacer;
+    for (NSXMLNode* found : nodes) {
+      pacer.turn();
+      run.results.addNode(found, run.context);
+    }
   }
   run.closeNodeList();
 }

@@ -3,6 +3,7 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/NodeOrder.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryTypeTable.h"
 
@@ -19,7 +20,9 @@ namespace {
 
 void XQueryPathResults::add(const NSObject* value, XQueryContext& context) {
   const XQueryItemList items(value);
+  WorkPacer pacer;
   for (size_t i = 0; i < items.count(); ++i) {
+    pacer.turn();
     if (!items[i]) return;
     addItem(items[i], context);
   }

@@ -2,6 +2,7 @@
 
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryNameTest.h"
+#include "Platform/WorkMeter.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryQName.h"
@@ -23,7 +24,9 @@ bool matchesAtomicType(const NSObject& subject, size_t count, const XQueryTypeDe
   if (id == XQueryTypeNone) return false;
   const auto* array = count > 1 ? dyn_cast<NSArray>(&subject) : nullptr;
   if (!array) return XQueryIsKindOfType(XQueryObjectTypeID(&subject), id);
+  WorkPacer pacer;
   for (const Value& member : array->objects()) {
+    pacer.turn();
     if (!XQueryIsKindOfType(XQueryObjectTypeID(member.get()), id)) return false;
   }
   return true;

@@ -1,5 +1,6 @@
 #include "Expr/XQueryUntypedText.h"
 
+#include "Platform/WorkMeter.h"
 #include "xquery/XMLNode.h"
 
 namespace xquery {
@@ -8,7 +9,9 @@ namespace {
 // Descends while an element or document has exactly one child. Answers the node whose own text is
 // the whole string value, or null when the text must be gathered.
 const NSXMLNode* holderOfWholeText(const NSXMLNode* node) {
+  WorkPacer pacer;
   for (;;) {
+    pacer.turn();
     if (node->kind() != Kind::Element && node->kind() != Kind::Document) return node;
     const NSXMLNode* child = node->firstChild();
     if (!child || child != node->lastChild()) return nullptr;

@@ -1,3 +1,4 @@
+#include "Platform/WorkMeter.h"
 #include "Platform/XMLNames.h"
 #include "Platform/XMLTree.h"
 #include "xquery/XMLNode.h"
@@ -13,19 +14,25 @@ Ref<NSXMLElement> NSXMLElement::elementWithName(NSStringView name, NSStringView 
 uint32_t NSXMLElement::attributeCount() const {
   uint32_t count = 0;
   for (const NSXMLNode* node = firstAttribute(); node; node = nextAttribute(node)) ++count;
+  chargeWork(count / WorkPacer::turnsPerStep);
   return count;
 }
 
 NSXMLNode* NSXMLElement::attributeForName(NSStringView name) const {
   NSXMLNode* attribute = firstAttribute();
-  while (attribute && !attribute->nameView().equals(name)) attribute = nextAttribute(attribute);
+  WorkPacer pacer;
+  for (; attribute && !attribute->nameView().equals(name); attribute = nextAttribute(attribute)) {
+    pacer.turn();
+  }
   return attribute;
 }
 
 NSXMLNode* NSXMLElement::attributeForLocalName(NSStringView localName, NSStringView URI) const {
   NSXMLNode* attribute = firstAttribute();
+  WorkPacer pacer;
   while (attribute &&
          !(attribute->localNameView().equals(localName) && attribute->URIView().equals(URI))) {
+    pacer.turn();
     attribute = nextAttribute(attribute);
   }
   return attribute;

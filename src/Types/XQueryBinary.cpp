@@ -1,5 +1,6 @@
 #include "Types/XQueryBinary.h"
 
+#include "Platform/WorkMeter.h"
 #include "Types/NameCharacters.h"
 
 #include <array>
@@ -53,7 +54,9 @@ uint32_t XQueryBinary::hash() const {
 std::string XQueryHexEncode(std::string_view bytes) {
   std::string text;
   text.reserve(bytes.size() * 2);
+  WorkPacer pacer;
   for (const char byte : bytes) {
+    pacer.turn();
     const auto value = static_cast<unsigned char>(byte);
     text += upperHexDigits[value >> 4];
     text += upperHexDigits[value & 15];
@@ -64,7 +67,9 @@ std::string XQueryHexEncode(std::string_view bytes) {
 std::string Base64Encode(std::string_view bytes) {
   std::string text;
   text.reserve((bytes.size() + 2) / 3 * 4);
+  WorkPacer pacer;
   for (size_t from = 0; from < bytes.size(); from += 3) {
+    pacer.turn();
     const size_t count = std::min<size_t>(3, bytes.size() - from);
     uint32_t group = 0;
     for (size_t index = 0; index < 3; ++index) {
@@ -85,7 +90,9 @@ bool Base64Decode(NSStringView text, std::string& bytes) {
   uint32_t group = 0;
   uint32_t accepted = 0;
   uint32_t pads = 0;
+  WorkPacer pacer;
   for (uint32_t index = 0; index < text.length(); ++index) {
+    pacer.turn();
     const char16_t unit = text[index];
     if (unit >= 128) return false;
     if (unit == u'=') {
@@ -113,7 +120,9 @@ Ref<XQueryHexBinary> XQueryHexBinary::binaryWithString(NSStringView text) {
   std::string bytes;
   bytes.reserve(text.length() / 2);
   uint8_t high = notADigit;
+  WorkPacer pacer;
   for (uint32_t index = 0; index < text.length(); ++index) {
+    pacer.turn();
     const char16_t unit = text[index];
     if (XQueryIsWhiteSpace(unit)) continue;
     const uint8_t digit = lookUp(sHexDecodeTable, unit);

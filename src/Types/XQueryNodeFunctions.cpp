@@ -54,8 +54,10 @@ class AttributesByName {
   AttributesByName(const NSXMLElement* element, uint32_t count) : _element(element) {
     constexpr uint32_t few = 32;
     if (count <= few) return;
+    WorkPacer pacer;
     for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
          attribute = NSXMLElement::nextAttribute(attribute)) {
+      pacer.turn();
       _table.emplace(attribute->nameView(), attribute);
     }
   }
@@ -79,8 +81,10 @@ bool sameAttributes(const NSXMLElement* a, const NSXMLElement* b) {
   const uint32_t count = b->attributeCount();
   if (count == refused) return false;
   const AttributesByName others(b, count);
+  WorkPacer pacer;
   for (const NSXMLNode* attribute = a->firstAttribute(); attribute;
        attribute = NSXMLElement::nextAttribute(attribute)) {
+    pacer.turn();
     const NSXMLNode* other = others.find(attribute->nameView());
     if (!other || !sameNameAndText(attribute, other)) return false;
   }

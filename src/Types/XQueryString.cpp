@@ -1,5 +1,6 @@
 #include "Types/XQueryString.h"
 
+#include "Platform/WorkMeter.h"
 #include "Types/NameCharacters.h"
 
 namespace xquery {
@@ -7,7 +8,9 @@ namespace xquery {
 namespace {
 
 bool allIn(const XQueryCharSet& set, NSStringView text, uint32_t from) {
+  WorkPacer pacer;
   for (uint32_t index = from; index < text.length(); ++index) {
+    pacer.turn();
     if (!set.contains(text[index])) return false;
   }
   return true;
@@ -24,7 +27,9 @@ Ref<XQueryString> typedString(bool accepted, const NSString& text, XQueryTypeID 
 }  // namespace
 
 bool XQueryString::isNormalizedString(NSStringView text) {
+  WorkPacer pacer;
   for (uint32_t index = 0; index < text.length(); ++index) {
+    pacer.turn();
     const char16_t unit = text[index];
     if (unit == u'\n' || unit == u'\r' || unit == u'\t') return false;
   }
@@ -34,7 +39,9 @@ bool XQueryString::isNormalizedString(NSStringView text) {
 bool XQueryString::isToken(NSStringView text) {
   if (!isNormalizedString(text)) return false;
   bool afterSpace = true;  // a space may not come first
+  WorkPacer pacer;
   for (uint32_t index = 0; index < text.length(); ++index) {
+    pacer.turn();
     const bool space = text[index] == u' ';
     if (space && afterSpace) return false;
     afterSpace = space;

@@ -1,20 +1,30 @@
 #include "Types/XQueryStringFunctions.h"
 
+#include "Platform/WorkMeter.h"
 #include "Types/NameCharacters.h"
 
 namespace xquery {
 
 namespace {
 
+// After so many units were looked at: only long stretches are work of their own.
+void checkUnits(uint32_t count) {
+  constexpr uint32_t unitsPerStep = 4096;
+  if (count >= unitsPerStep) checkWork(count / unitsPerStep);
+}
+
 uint32_t leadingWhiteSpace(NSStringView text) {
   uint32_t count = 0;
   while (count < text.length() && XQueryIsWhiteSpace(text[count])) ++count;
+  checkUnits(count);
   return count;
 }
 
 // The first position at or after `from` that holds (or does not hold) white space, or the end.
 uint32_t nextWhiteSpace(NSStringView text, uint32_t from, bool whiteSpace) {
+  const uint32_t start = from;
   while (from < text.length() && XQueryIsWhiteSpace(text[from]) != whiteSpace) ++from;
+  checkUnits(from - start);
   return from;
 }
 
@@ -25,6 +35,7 @@ Ref<NSString> XQueryStringTrimWS(const Ref<NSString>& string) {
   const uint32_t from = leadingWhiteSpace(text);
   uint32_t end = text.length();
   while (end > from && XQueryIsWhiteSpace(text[end - 1])) --end;
+  checkUnits(text.length() - end);
   if (end - from == text.length()) return string;
   return NSString::stringWithView(text.substring(from, end - from));
 }
@@ -56,7 +67,9 @@ void XQueryNormalizeAttributeString(NSMutableString& string) {
   const NSStringView text = string.view();
   NSMutableString normalized;
   uint32_t from = 0;
+  WorkPacer pacer;
   for (uint32_t index = 0; index < text.length(); ++index) {
+    pacer.turn();
     if (text[index] == u' ' || !XQueryIsWhiteSpace(text[index])) continue;
     normalized.append(text.substring(from, index - from));
     normalized.append(u' ');
