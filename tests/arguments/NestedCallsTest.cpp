@@ -1,6 +1,8 @@
 // Calls in calls, at random but the same each time: whatever comes out of one function goes into
 // another, and the end is a value or an error that says what is wrong.
 #include "arguments/Driver.h"
+#include "Types/XQueryCasting.h"
+#include "Types/XQueryString.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>
@@ -22,6 +24,39 @@ std::vector<const Function*> everyFunction() {
     for (const Function& function : *family) functions.push_back(&function);
   }
   return functions;
+}
+
+Value asType(XQueryTypeID type, const std::string& text) {
+  const Ref<XQueryContext> context = XQueryContext::xqueryContext();
+  return XQueryCastAs(XQueryString::stringWithString(*NSString::stringWithUTF8(text)), type,
+                      *context);
+}
+
+// Beside the samples what is long, large, or in a shape that only a host can give.
+const std::vector<std::pair<std::string, Value>>& values() {
+  static const std::vector<std::pair<std::string, Value>> all = [] {
+    std::vector<std::pair<std::string, Value>> list;
+    for (const Sample& sample : samples()) list.emplace_back(sample.name, sample.value);
+    const Value one = sampleNamed("42 '12'").value;
+    list.emplace_back("no items", NSArray::array());
+    list.emplace_back("one item", NSArray::arrayWithObjects({one}));
+    list.emplace_back("one node", NSArray::arrayWithObjects({sampleNamed("p:e").value}));
+    list.emplace_back("many", NSArray::arrayWithObjects(std::vector<Value>(2000, one)));
+    list.emplace_back("long text", asType(9, std::string(20000, 'a') + "b"));
+    list.emplace_back("wide text", asType(9, std::string(5000, 'a') + "\U0001F600\u00e9"));
+    list.emplace_back("large", asType(42, "9223372036854775807"));
+    list.emplace_back("small", asType(42, "-9223372036854775808"));
+    list.emplace_back("larger", asType(42, "1" + std::string(400, '0')));
+    list.emplace_back("tiny", asType(13, "0." + std::string(400, '0') + "1"));
+    list.emplace_back("largest", asType(11, "1.7976931348623157e308"));
+    list.emplace_back("far year", asType(21, "999999-12-31T23:59:59.999Z"));
+    list.emplace_back("long duration", asType(29, "P99999999999D"));
+    list.emplace_back("many months", asType(28, "-P999999999Y"));
+    list.emplace_back("far zone", asType(23, "00:00:00-99:99"));
+    for (const auto& [name, value] : list) EXPECT_TRUE(value) << name;
+    return list;
+  }();
+  return all;
 }
 
 class Generator {
@@ -69,17 +104,17 @@ void evaluateOften(const std::string& body, Generator& generator, XQueryContext&
   ASSERT_FALSE(query->parseErrors()) << body;
   for (int round = 0; round < 5; ++round) {
     XQueryConstants constants;
-    std::string values;
+    std::string chosen;
     for (const char name : std::string_view("abcde")) {
-      const Sample& sample = samples()[generator.below(samples().size())];
-      constants[std::string(1, name)] = sample.value;
-      values += std::string(" $") + name + " " + sample.name;
+      const auto& [label, value] = values()[generator.below(values().size())];
+      constants[std::string(1, name)] = value;
+      chosen += std::string(" $") + name + " " + label;
     }
     Ref<XQueryError> error;
     const Ref<NSArray> items = context.evaluateXQuery(*query, constants, nullptr, &error);
-    ASSERT_TRUE(items || error) << body << values;
+    ASSERT_TRUE(items || error) << body << chosen;
     if (error) {
-      ASSERT_TRUE(saysWhatIsWrong(*error)) << body << values << " " << show(*error);
+      ASSERT_TRUE(saysWhatIsWrong(*error)) << body << chosen << " " << show(*error);
     } else {
       ASSERT_FALSE(show(Value(items)).empty());
     }

@@ -1,5 +1,6 @@
 // matches, replace and tokenize. The texts among the samples hold few characters that mean
-// something in a pattern, so that a small reading of patterns is enough here.
+// something in a pattern, so that a small reading of patterns is enough here. Pieces and replaced
+// texts are plain, hence untyped; only the piece of nothing is a string.
 #include "arguments/Driver.h"
 
 #include <gtest/gtest.h>
@@ -75,10 +76,10 @@ Sequence tokenize(const Call& call) {
   Sequence pieces;
   size_t from = 0;
   for (const auto& [start, end] : places(texts.input, *pattern)) {
-    pieces.push_back(string(texts.input.substr(from, start - from)));
+    pieces.push_back(untyped(texts.input.substr(from, start - from)));
     from = end;
   }
-  pieces.push_back(string(texts.input.substr(from)));
+  pieces.push_back(untyped(texts.input.substr(from)));
   return pieces;
 }
 
@@ -98,7 +99,7 @@ Sequence replace(const Call& call) {
     result += texts.input.substr(from, start - from) + expanded(texts.replacement);
     from = end;
   }
-  return one(string(result + texts.input.substr(from)));
+  return one(untyped(result + texts.input.substr(from)));
 }
 
 }  // namespace
@@ -110,6 +111,10 @@ const std::vector<Function>& patternFunctions() {
       {"fn:replace", 3, 4, replace},
   };
   return functions;
+}
+
+TEST(PatternArguments, EndAsTheRulesSay) {
+  expectRules(patternFunctions());
 }
 
 }  // namespace xquery::arguments

@@ -102,8 +102,14 @@ Item itemOf(const Node& node) {
 // The combinations of three and more are made of these.
 bool isUsualRow(const Row& row) {
   static const std::vector<std::pair<int, std::string_view>> usual = {
-      {9, "abcd"}, {9, ""},       {9, "i"},  {8, "1"},  {42, "12"},
-      {11, "1.5"}, {10, "false"}, {9, "$1"}, {26, "0f"}};
+      {9, "abcd"},    {9, ""},
+      {9, "i"},       {8, "1"},
+      {42, "12"},     {11, "1.5"},
+      {11, "NaN"},    {13, "-128.9"},
+      {10, "false"},  {9, "$1"},
+      {26, "0f"},     {34, "abcd"},
+      {14, "abcd"},   {22, "2004-02-29"},
+      {29, "P1DT2H"}, {9, "\u00e9\U0001F600"}};
   for (const auto& [type, from] : usual) {
     if (row.type == type && row.from == from) return true;
   }
@@ -151,7 +157,15 @@ std::vector<Sample> makeSamples() {
                  XQueryQName::qname(name, NSString::stringWithASCII("u")),
                  true,
                  false});
-  all.push_back({"data", {{0, "data 6162"}}, NSData::dataWithBytes("ab"), true, false});
+  all.push_back({"data", {{0, "data 6162"}}, NSData::dataWithBytes("ab"), true, true});
+  // Numbers of the platform are doubles.
+  const Item double15 = {11, "1.5", nullptr, rowOf(11, "1.5")};
+  all.push_back({"platform double", {double15}, NSNumber::numberWithDouble(1.5), true, false});
+  all.push_back({"platform decimal",
+                 {double15},
+                 NSDecimalNumber::decimalNumberWithString(NSStringView::ascii("1.5")),
+                 true,
+                 false});
 
   const std::vector<Sample> single = all;
   all.push_back(sequenceOf("two", single, {"42 '12'", "9 'abcd'"}, true, true));
