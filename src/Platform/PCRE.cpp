@@ -32,7 +32,7 @@ constexpr size_t bytesPerUnit = 8;
 constexpr int64_t unitsPerSearch = 16;
 constexpr int64_t unitsPerBackReference = 8;
 
-constexpr double mostSeconds = 0.8;
+constexpr double mostSeconds = 0.5;
 constexpr double mostSecondsPerByte = 1e-6;
 constexpr uint32_t looksPerClock = 32;  // asking for the time of a thread is a system call
 
@@ -40,9 +40,13 @@ constexpr uint32_t matchLimit = 20'000'000;
 // Of a pattern without callouts: the limit counts anew at every place of the subject.
 constexpr uint32_t fewestMatches = 1000;
 constexpr uint32_t depthLimit = 1'000'000;
-constexpr uint32_t heapLimit = 64 * 1024;  // KiB
-constexpr size_t firstJITStack = size_t{64} << 10;
-constexpr size_t mostJITStack = size_t{64} << 20;
+
+// The memory for going back, interpreting or not: patterns that recurse without end are to notice
+// soon that there is none left.
+constexpr size_t firstMemory = size_t{64} << 10;
+constexpr size_t leastMemory = size_t{4} << 20;
+constexpr size_t memoryPerByte = 256;
+constexpr size_t mostMemory = size_t{64} << 20;
 
 // The library needs 20 bytes for each of the pattern while it compiles.
 constexpr size_t mostPatternBytes = size_t{2} << 20;
@@ -291,8 +295,12 @@ struct PCRESearch::State {
     pcre2_set_match_limit(context.get(),
                           pattern.callouts ? matchLimit : std::max(few, fewestMatches));
     pcre2_set_depth_limit(context.get(), depthLimit);
-    pcre2_set_heap_limit(context.get(), heapLimit);
+    pcre2_set_heap_limit(context.get(), static_cast<uint32_t>(memoryLimit() / 1024));
     pcre2_set_callout(context.get(), callout, this);
+  }
+
+  size_t memoryLimit() const {
+    return std::min(leastMemory + subject.size() * memoryPerByte, mostMemory);
   }
 
   // Nothing may be thrown through the library: what is thrown is kept and the match ended.
@@ -317,7 +325,7 @@ struct PCRESearch::State {
   }
 
   void growStack() {
-    stack.reset(required(pcre2_jit_stack_create(firstJITStack, mostJITStack, nullptr)));
+    stack.reset(required(pcre2_jit_stack_create(firstMemory, memoryLimit(), nullptr)));
     pcre2_jit_stack_assign(context.get(), nullptr, stack.get());
   }
 

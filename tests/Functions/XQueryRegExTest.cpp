@@ -550,5 +550,43 @@ TEST(RegExGenerated, TextThatIsNotMatchedAndMatchesTogetherAreTheSubject) {
   }
 }
 
+// Patterns put together at random, most of them odd and many of them invalid.
+TEST(RegExGenerated, AnyPatternThatCompilesHoldsTheRules) {
+  std::mt19937 random(22);
+  const auto parts = std::to_array<const char*>(
+      {"a",         "b",     "ä",     ".",      "[ab]",    "[^a]",         "(",      ")",
+       "(?:",       "|",     "*",     "+",      "?",       "{2}",          "{1,3}",  "^",
+       "$",         "\\b",   "\\w",   "\\1",    "\\2",     "(?=",          "(?!",    "(?<=",
+       "(?<!",      "\\K",   "\\G",   "(?R)",   "(?1)",    "\\C",          "\\X",    "\\R",
+       "(?>",       "(?|",   "*?",    "++",     "\\i",     "[\\w-a]",      "\\p{L}", "(*SKIP)",
+       "(*F)",      "(?(1)", "(?i)",  "\\Qa",   "\\E",     "&#97;",        "&#x61;", "(*COMMIT)",
+       "(*ACCEPT)", "(?C1)", "(?<n>", "\\k<n>", "\\x{e4}", "[[:alpha:]-z]"});
+  const auto letters = std::to_array<const char*>({"a", "b", "A", "ä", "1", " ", "\n", "€"});
+  int compiledCount = 0;
+  for (int round = 0; round < 20'000; ++round) {
+    std::string pattern;
+    for (size_t left = 1 + random() % 7; left > 0; --left)
+      pattern += parts[random() % parts.size()];
+    const auto compiled = regEx(pattern, round % 5 == 0 ? "smi" : "");
+    if (!compiled) continue;
+    ++compiledCount;
+    std::string subject;
+    const size_t known = round % 2 == 0 ? 3 : letters.size();
+    for (size_t left = random() % 12; left > 0; --left) subject += letters[random() % known];
+    const auto string = text(subject);
+    const Value matched = compiled->matches(string.get());
+    const Value between = compiled->tokenize(string.get());
+    const Value same = compiled->replace(string.get(), text("$0")->view());
+    ASSERT_EQ(!matched, !between) << pattern << " in " << subject;
+    ASSERT_EQ(!matched, !same) << pattern << " in " << subject;
+    if (!matched) continue;
+    ASSERT_EQ(unitsOf(between).size(), unitsOf(matched).size() + 1) << pattern << " in " << subject;
+    ASSERT_EQ(cast<NSString>(same)->utf8(), subject) << pattern;
+    ASSERT_EQ(show(compiled->hasMatch(string.get())), unitsOf(matched).empty() ? "false" : "true")
+        << pattern << " in " << subject;
+  }
+  EXPECT_GT(compiledCount, 3000);
+}
+
 }  // namespace
 }  // namespace xquery

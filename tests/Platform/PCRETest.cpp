@@ -175,6 +175,16 @@ TEST(PCRELimits, MatchingInTheMachineAndInterpretingFailAlike) {
   }
 }
 
+TEST(PCRELimits, EndlessRecursionFails) {
+  for (const char* pattern : {"(?R)", "(?R)+a", "a?(?R)b", "(?<n>(?&n)a)"}) {
+    const auto code = PCREPattern::compile(pattern, PCREUTF8);
+    ASSERT_TRUE(code) << pattern;
+    for (int round = 0; round < 2; ++round) {
+      EXPECT_EQ(PCRESearch(*code, "ab").find(0, 0), Outcome::Failed) << pattern;
+    }
+  }
+}
+
 TEST(PCRELimits, WhatGrowsWithTheSubjectIsAllowed) {
   const std::string text = repeated("ab", 500'000);
   EXPECT_EQ(search("^(a|b)*$", text), "0-1000000 999999-1000000");
