@@ -1,17 +1,14 @@
 // Several threads at once: one query over one document, each thread with a context of its own;
-// compilations; first uses; values handed from thread to thread. The tests say what the results
-// must be; that nothing else goes wrong is for ThreadSanitizer to say.
+// compilations; first uses; values handed from thread to thread.
+#include "Eval/ConcurrencyTesting.h"
 #include "Platform/LoadingTestSupport.h"
-#include "xquery/xquery.h"
 
 #include <gtest/gtest.h>
 
 #include <barrier>
 #include <deque>
-#include <functional>
 #include <map>
 #include <mutex>
-#include <ostream>
 #include <string>
 #include <thread>
 #include <vector>
@@ -19,102 +16,7 @@
 namespace xquery {
 namespace {
 
-constexpr int threadCount = 4;
-constexpr int evaluations = 4;
-constexpr int rounds = 30;
-
-// What the threads found wrong.
-class Complaints {
- public:
-  void add(const std::string& text) {
-    const std::lock_guard guard(_mutex);
-    _texts.push_back(text);
-  }
-  const std::vector<std::string>& texts() const { return _texts; }
-
- private:
-  std::mutex _mutex;
-  std::vector<std::string> _texts;
-};
-
-// Runs the work in all threads, which begin together, and answers when they are done.
-std::vector<std::string> together(
-    const std::function<void(int thread, Complaints& complaints)>& work) {
-  Complaints complaints;
-  std::barrier start(threadCount);
-  std::vector<std::thread> threads;
-  for (int t = 0; t < threadCount; ++t) {
-    threads.emplace_back([&, t] {
-      start.arrive_and_wait();
-      work(t, complaints);
-    });
-  }
-  for (auto& thread : threads) thread.join();
-  return complaints.texts();
-}
-
-const std::vector<std::string> none;
-
-Ref<NSXMLDocument> parsed(std::string_view xml) {
-  return NSXMLDocument::documentWithData(xml, NSXMLNodePreserveWhitespace);
-}
-
-std::string library(int books) {
-  std::string xml = "<library xmlns:m=\"urn:m\"><!-- all --><?style plain?>";
-  for (int i = 0; i < books; ++i) {
-    const std::string number = std::to_string(i);
-    xml += "<book id=\"b" + number + "\" m:kind=\"k" + std::to_string(i % 3) + "\"><title>Title " +
-           number + (i % 5 == 0 ? " \xC3\xA9t\xC3\xA9" : "") + "</title><price>" +
-           std::to_string((i * 37) % 100) + ".5</price><day>20" + (i % 90 < 10 ? "0" : "") +
-           std::to_string(i % 90) + "-02-1" + std::to_string(i % 9) + "</day><m:note>n<b>" +
-           number + "</b></m:note></book>";
-  }
-  return xml + "</library>";
-}
-
-std::string printed(const Ref<NSArray>& items, const Ref<XQueryError>& error) {
-  if (!items) return error ? "error: " + error->description()->utf8() : "nothing";
-  std::string text;
-  for (const Value& item : items->objects()) {
-    text += XQueryItemTypeName(*item) + ' ';
-    if (const auto* node = dyn_cast<NSXMLNode>(item)) {
-      node->appendXMLTo(text);
-    } else {
-      text += XQueryItemStringValue(*item);
-    }
-    text += '\n';
-  }
-  return text;
-}
-
-Ref<XQueryContext> newContext() {
-  return XQueryContext::xqueryContextWithNamespaces({{"late", "urn:late"}});
-}
-
-std::string evaluated(XQueryContext& context, const XQuery& query, const Value& item,
-                      const XQueryConstants& constants = {}) {
-  Ref<XQueryError> error;
-  const auto items = context.evaluateXQuery(query, constants, item, &error);
-  return printed(items, error);
-}
-std::string evaluated(const XQuery& query, const Value& item,
-                      const XQueryConstants& constants = {}) {
-  return evaluated(*newContext(), query, item, constants);
-}
-
-std::string evaluated(std::string_view source, const Value& item = Value()) {
-  return evaluated(*XQuery::xqueryWithSource(source), item);
-}
-
 // --- one query, one document ---------------------------------------------------------------------
-
-struct Work {
-  const char* name;
-  const char* query;
-};
-void PrintTo(const Work& work, std::ostream* out) {
-  *out << work.name;
-}
 
 constexpr Work works[] = {
     {"Paths", "count(//book/title), //book[price > 90]/title, /library/book[3]/@id"},
@@ -183,35 +85,13 @@ constexpr Work works[] = {
 
 class SharedQuery : public testing::TestWithParam<Work> {};
 
-// Each round has a query and a document that nobody has used, so that whatever they make on first
-// use is made by threads that meet there. The expected text comes from yet others.
 TEST_P(SharedQuery, GivesEveryThreadTheSame) {
-  const std::string xml = library(20);
-  const std::string_view source = GetParam().query;
-  const std::string expected = evaluated(source, parsed(xml));
-  std::vector<Ref<XQuery>> queries;
-  std::vector<Value> documents;
-  for (int round = 0; round < rounds; ++round) {
-    queries.push_back(XQuery::xqueryWithSource(source));
-    ASSERT_FALSE(queries.back()->parseErrors());
-    documents.push_back(parsed(xml));
-  }
-  std::barrier roundStart(threadCount);
-  EXPECT_EQ(together([&](int, Complaints& complaints) {
-              for (size_t round = 0; round < rounds; ++round) {
-                const auto context = newContext();
-                roundStart.arrive_and_wait();
-                const std::string found = evaluated(*context, *queries[round], documents[round]);
-                if (found != expected) complaints.add(found);
-              }
-            }),
-            none);
-  EXPECT_EQ(expected.starts_with("error"), std::string(GetParam().name) == "Errors" ||
-                                               std::string(GetParam().name) == "MissingGlobals")
+  std::vector<std::string> complaints;
+  const std::string expected = evaluatedTogether(GetParam().query, library(20), complaints);
+  EXPECT_EQ(complaints, none);
+  const std::string name = GetParam().name;
+  EXPECT_EQ(expected.starts_with("error"), name == "Errors" || name == "MissingGlobals")
       << expected;
-  // The document is what it was.
-  EXPECT_EQ(cast<NSXMLDocument>(documents[0])->XMLString()->utf8(),
-            parsed(xml)->XMLString()->utf8());
 }
 
 INSTANTIATE_TEST_SUITE_P(Concurrency, SharedQuery, testing::ValuesIn(works),
