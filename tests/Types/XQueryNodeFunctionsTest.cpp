@@ -239,7 +239,7 @@ std::string elementWithAttributes(int first, int last, int step, std::string_vie
 }
 
 TEST(NodeEqual, ManyAttributesAreFoundByName) {
-  constexpr int many = 30000;
+  constexpr int many = 12000;
   const auto ascending = parse(elementWithAttributes(0, many, 1, "x"));
   const auto descending = parse(elementWithAttributes(many - 1, -1, -1, "x"));
   const auto different = parse(elementWithAttributes(0, many, 1, "y"));
@@ -249,7 +249,7 @@ TEST(NodeEqual, ManyAttributesAreFoundByName) {
   EXPECT_FALSE(XQueryNodeEqual(ascending.get(), different.get(), nullptr));
   EXPECT_FALSE(XQueryNodeEqual(ascending.get(), fewer.get(), nullptr));
   EXPECT_TRUE(XQueryNodeEqual(fewer.get(), ascending.get(), nullptr));
-  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(1));
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(400));
 }
 
 TEST(NodeEqual, ANodeIsEqualToItselfAndToNoOtherKind) {
