@@ -3,6 +3,7 @@
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryTextArgument.h"
 #include "Platform/ICUText.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
@@ -53,7 +54,9 @@ template <class Units>
 Value integers(const Units& units) {
   std::vector<Value> items;
   items.reserve(units.size());
+  WorkPacer pacer;
   for (const auto unit : units) {
+    pacer.turn();
     items.push_back(XQueryNumber::integerWithInt64(static_cast<int64_t>(unit)));
   }
   return normalised(NSArray::arrayWithObjects(std::move(items)));
@@ -68,7 +71,9 @@ Value fn_codepoints_to_string(const Value* arguments, size_t count, XQueryContex
   std::vector<int32_t> points;
   points.reserve(items.count());
   bool ascii = true;
+  WorkPacer pacer;
   for (size_t index = 0; index < items.count(); ++index) {
+    pacer.turn();
     const auto point = codePointOf(items[index], context);
     if (!point) return Value();
     ascii = ascii && *point < 0x80;

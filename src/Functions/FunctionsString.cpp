@@ -2,6 +2,7 @@
 
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryTextArgument.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
@@ -26,7 +27,9 @@ Value textToConcat(const Value& argument, XQueryContext& context) {
 std::optional<size_t> narrowJoinedLength(const NSArray& items, NSStringView separator) {
   if (separator.isWide() || items.count() == 0) return std::nullopt;
   size_t length = (items.count() - 1) * size_t{separator.length()};
+  WorkPacer pacer;
   for (const Value& item : items.objects()) {
+    pacer.turn();
     const auto* string = dyn_cast<NSString>(item);
     if (!string || string->view().isWide()) return std::nullopt;
     length += string->length();
@@ -36,7 +39,9 @@ std::optional<size_t> narrowJoinedLength(const NSArray& items, NSStringView sepa
 
 Value joined(const NSArray& items, NSStringView separator, XQueryContext& context) {
   NSMutableString text;
+  WorkPacer pacer;
   for (size_t index = 0; index < items.count(); ++index) {
+    pacer.turn();
     if (index > 0) text.append(separator);
     text.append(XQueryTextArgument(items.objects()[index], context).view());
   }
@@ -48,7 +53,9 @@ Value joinedNarrow(const NSArray& items, NSStringView separator, size_t length) 
   if (length >= NSStringView::notFound) throw std::bad_alloc();
   std::string text;
   text.reserve(length);
+  WorkPacer pacer;
   for (size_t index = 0; index < items.count(); ++index) {
+    pacer.turn();
     if (index > 0) text.append(separator.asciiUnits(), separator.length());
     const NSStringView piece = cast<NSString>(items.objects()[index])->view();
     text.append(piece.asciiUnits(), piece.length());

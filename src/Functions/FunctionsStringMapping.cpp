@@ -5,6 +5,7 @@
 
 #include "Functions/XQueryTextArgument.h"
 #include "Platform/ICUText.h"
+#include "Platform/TextBlocks.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"
@@ -19,10 +20,6 @@
 namespace xquery {
 namespace {
 
-NSStringView viewOf(const std::u16string& text) {
-  return {text.data(), static_cast<uint32_t>(text.size())};
-}
-
 Value asString(const Value& value, XQueryContext& context) {
   return XQueryCastAsTypeForContext(value, XQueryTypeString, context);
 }
@@ -30,12 +27,17 @@ Value asString(const Value& value, XQueryContext& context) {
 // --- case ----------------------------------------------------------------------------------------
 
 // The text with the letters from `first` on, 26 of them, in the other case.
-std::string otherCase(NSStringView text, char first) {
-  std::string mapped(text.asciiUnits(), text.length());
-  for (char& unit : mapped) {
-    const bool letter = static_cast<unsigned char>(unit - first) < 26;
-    unit = static_cast<char>(unit ^ (letter ? 'a' ^ 'A' : 0));
-  }
+std::string otherCase(std::string_view text, char first) {
+  std::string mapped;
+  mapped.reserve(text.size());
+  inBlocks(text, [&](std::string_view block) {
+    const size_t start = mapped.size();
+    mapped.append(block);
+    for (size_t index = start; index < mapped.size(); ++index) {
+      const bool letter = static_cast<unsigned char>(mapped[index] - first) < 26;
+      mapped[index] = static_cast<char>(mapped[index] ^ (letter ? 'a' ^ 'A' : 0));
+    }
+  });
   return mapped;
 }
 
@@ -47,7 +49,7 @@ Value caseMapped(const Value* arguments, size_t count, XQueryContext& context, c
   if (text.isWide()) {
     return XQueryString::stringWithView(viewOf(mapWide({text.wideUnits(), text.length()})));
   }
-  return XQueryString::stringWithView(NSStringView::ascii(otherCase(text, first)));
+  return XQueryString::stringWithView(viewOf(otherCase({text.asciiUnits(), text.length()}, first)));
 }
 
 // --- normalisation forms -------------------------------------------------------------------------
@@ -93,21 +95,19 @@ class TranslationTable {
                      [](const Entry& a, const Entry& b) { return a.unit < b.unit; });
   }
 
-  void appendTo(std::string& out, NSStringView text) const {
-    const char* units = text.asciiUnits();
-    for (uint32_t index = 0; index < text.length(); ++index) {
-      const auto unit = static_cast<unsigned char>(units[index]);
-      const int32_t target = _ascii[unit];
-      if (target != removed) out += static_cast<char>(target == kept ? unit : target);
-    }
-  }
-
-  void appendTo(std::u16string& out, NSStringView text) const {
-    for (uint32_t index = 0; index < text.length(); ++index) {
-      const char16_t unit = text[index];
-      const int32_t target = unit < _ascii.size() ? _ascii[unit] : targetOfOther(unit);
-      if (target != removed) out += target == kept ? unit : static_cast<char16_t>(target);
-    }
+  // The text in units that hold every unit of the text and of the translation.
+  template <class Unit, class TextUnit>
+  std::basic_string<Unit> translated(std::basic_string_view<TextUnit> text) const {
+    std::basic_string<Unit> out;
+    out.reserve(text.size());
+    inBlocks(text, [&](std::basic_string_view<TextUnit> block) {
+      for (const TextUnit textUnit : block) {
+        const char16_t unit = textUnit;
+        const int32_t target = unit < _ascii.size() ? _ascii[unit] : targetOfOther(unit);
+        if (target != removed) out += static_cast<Unit>(target == kept ? unit : target);
+      }
+    });
+    return out;
   }
 
  private:
@@ -162,20 +162,24 @@ std::string percentEscaped(std::string_view utf8, const UnescapedSet& unescaped)
   constexpr char digits[] = "0123456789ABCDEF";
   std::string out;
   out.reserve(utf8.size());
-  for (const char unit : utf8) {
-    if (unescaped.contains(unit)) {
-      out += unit;
-    } else {
-      const auto byte = static_cast<unsigned char>(unit);
-      out += {'%', digits[byte >> 4], digits[byte & 0xF]};
+  inBlocks(utf8, [&](std::string_view block) {
+    for (const char unit : block) {
+      if (unescaped.contains(unit)) {
+        out += unit;
+      } else {
+        const auto byte = static_cast<unsigned char>(unit);
+        out += {'%', digits[byte >> 4], digits[byte & 0xF]};
+      }
     }
-  }
+  });
   return out;
 }
 
 bool hasLoneSurrogate(NSStringView text) {
   if (!text.isWide()) return false;
+  WorkPacer pacer;
   for (uint32_t index = 0; index < text.length(); ++index) {
+    pacer.turn();
     const char16_t unit = text[index];
     if (unit < 0xD800 || unit > 0xDFFF) continue;
     const char16_t next = index + 1 < text.length() ? text[index + 1] : u'\0';
@@ -224,16 +228,12 @@ Value fn_translate(const Value* arguments, size_t count, XQueryContext& context)
   const XQueryTextArgument map(arguments[1], context);
   const XQueryTextArgument translation(arguments[2], context);
   const TranslationTable table(map.view(), translation.view());
-  if (!text.view().isWide() && !translation.view().isWide()) {
-    std::string translated;
-    translated.reserve(text.view().length());
-    table.appendTo(translated, text.view());
-    return XQueryString::stringWithView(NSStringView::ascii(translated));
-  }
-  std::u16string translated;
-  translated.reserve(text.view().length());
-  table.appendTo(translated, text.view());
-  return XQueryString::stringWithView(viewOf(translated));
+  return withUnitsOf(text.view(), [&]<class Unit>(std::basic_string_view<Unit> units) {
+    if (translation.view().isWide()) {
+      return Value(XQueryString::stringWithView(viewOf(table.translated<char16_t>(units))));
+    }
+    return Value(XQueryString::stringWithView(viewOf(table.translated<Unit>(units))));
+  });
 }
 
 Value fn_escape_uri(const Value* arguments, size_t count, XQueryContext& context) {
@@ -247,7 +247,7 @@ Value fn_escape_uri(const Value* arguments, size_t count, XQueryContext& context
   const std::string escaped = text.isWide()
                                   ? percentEscaped(text.utf8(), unescaped)
                                   : percentEscaped({text.asciiUnits(), text.length()}, unescaped);
-  return XQueryString::stringWithView(NSStringView::ascii(escaped));
+  return XQueryString::stringWithView(viewOf(escaped));
 }
 
 }  // namespace xquery

@@ -1,5 +1,7 @@
 #include "Platform/ICUText.h"
 
+#include "Platform/WorkMeter.h"
+
 #include <unicode/uchar.h>
 #include <unicode/unorm2.h>
 #include <unicode/ustring.h>
@@ -65,7 +67,9 @@ constexpr size_t longRun = 128;
 
 bool hasLongRunOfMarks(std::u16string_view text) {
   size_t run = 0;
+  WorkPacer pacer;
   for (size_t index = 0; index < text.size();) {
+    pacer.turn();
     UChar32 point = 0;
     U16_NEXT(text.data(), index, text.size(), point);
     run = startsWithMark(point) ? run + 1 : 0;
@@ -104,7 +108,9 @@ std::u16string orderedDecomposition(std::u16string_view text, const UNormalizer2
       append(point);
     }
   };
+  WorkPacer pacer;
   for (size_t index = 0; index < text.size();) {
+    pacer.turn();
     UChar32 point = 0;
     U16_NEXT(text.data(), index, text.size(), point);
     char16_t parts[64];  // no decomposition is longer than 18 units
@@ -132,29 +138,91 @@ std::u16string normalizedBy(const UNormalizer2* instance, std::u16string_view te
       }));
 }
 
-}  // namespace
+// --- long texts ----------------------------------------------------------------------------------
+
+// The code points on the two sides of an index; a lone surrogate is itself.
+struct Neighbours {
+  UChar32 before;
+  UChar32 after;
+};
+
+Neighbours neighboursAt(std::u16string_view text, size_t index) {
+  Neighbours found{};
+  size_t next = index;
+  U16_NEXT(text.data(), next, text.size(), found.after);
+  U16_PREV(text.data(), 0, index, found.before);
+  return found;
+}
+
+// The results of the pieces of a text, which is cut only where `mayCut` says that it makes no
+// difference, so that a long text can be left in the middle.
+template <class MayCut, class Convert>
+std::u16string inPieces(std::u16string_view text, MayCut mayCut, Convert convert) {
+  constexpr size_t pieceLength = 8192;
+  constexpr size_t unitsPerStep = 512;
+  std::u16string result;
+  while (text.size() > pieceLength) {
+    size_t length = pieceLength;
+    for (; length < text.size(); ++length) {
+      const Neighbours at = neighboursAt(text, length);
+      const bool insidePair = U16_IS_LEAD(at.before) && U16_IS_TRAIL(at.after);
+      if (!insidePair && mayCut(at)) break;
+    }
+    result += convert(text.substr(0, length));
+    text.remove_prefix(length);
+    checkWork(length / unitsPerStep);
+  }
+  if (result.empty()) return convert(text);
+  return result += convert(text);
+}
+
+// Whether a sigma is final depends on the letters around it and around ignorable characters beside
+// it.
+bool endsSearchForFinalSigma(UChar32 point) {
+  constexpr UChar32 sigma = 0x3A3;
+  return point != sigma && !u_hasBinaryProperty(point, UCHAR_CASE_IGNORABLE);
+}
+
+using CaseMapping = int32_t (*)(char16_t*, int32_t, const char16_t*, int32_t, const char*,
+                                UErrorCode*);
 
 // The empty name is that of the root locale; a null one would mean the process's.
-std::u16string upperCasedText(std::u16string_view text) {
+std::u16string caseMapped(std::u16string_view text, CaseMapping mapping) {
   return orOutOfMemory(converted<std::u16string>(
       text.size(), [&](char16_t* out, int32_t capacity, UErrorCode* status) {
-        return u_strToUpper(out, capacity, text.data(), checkedCount(text.size()), "", status);
+        return mapping(out, capacity, text.data(), checkedCount(text.size()), "", status);
       }));
+}
+
+}  // namespace
+
+std::u16string upperCasedText(std::u16string_view text) {
+  return inPieces(
+      text, [](Neighbours) { return true; },
+      [](std::u16string_view piece) { return caseMapped(piece, u_strToUpper); });
 }
 
 std::u16string lowerCasedText(std::u16string_view text) {
-  return orOutOfMemory(converted<std::u16string>(
-      text.size(), [&](char16_t* out, int32_t capacity, UErrorCode* status) {
-        return u_strToLower(out, capacity, text.data(), checkedCount(text.size()), "", status);
-      }));
+  return inPieces(
+      text,
+      [](Neighbours at) {
+        return endsSearchForFinalSigma(at.before) && endsSearchForFinalSigma(at.after);
+      },
+      [](std::u16string_view piece) { return caseMapped(piece, u_strToLower); });
 }
 
 std::u16string normalizedText(std::u16string_view text, NSNormalizationForm form) {
-  if (!hasLongRunOfMarks(text)) return normalizedBy(normalizer(form), text);
+  const UNormalizer2* instance = normalizer(form);
   const bool compatible = form == NSNormalizationForm::KC || form == NSNormalizationForm::KD;
   const UNormalizer2* decomposer =
       normalizer(compatible ? NSNormalizationForm::KD : NSNormalizationForm::D);
-  return normalizedBy(normalizer(form), orderedDecomposition(text, decomposer));
+  return inPieces(
+      text, [&](Neighbours at) { return unorm2_hasBoundaryBefore(instance, at.after) != 0; },
+      [&](std::u16string_view piece) {
+        return hasLongRunOfMarks(piece)
+                   ? normalizedBy(instance, orderedDecomposition(piece, decomposer))
+                   : normalizedBy(instance, piece);
+      });
 }
 
 std::optional<std::u16string> textWithCodePoints(const std::vector<int32_t>& points) {

@@ -1,7 +1,10 @@
 #include "Types/XQueryStringFunctions.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/TextBlocks.h"
 #include "Types/NameCharacters.h"
+
+#include <algorithm>
+#include <string>
 
 namespace xquery {
 
@@ -20,12 +23,34 @@ uint32_t leadingWhiteSpace(NSStringView text) {
   return count;
 }
 
-// The first position at or after `from` that holds (or does not hold) white space, or the end.
-uint32_t nextWhiteSpace(NSStringView text, uint32_t from, bool whiteSpace) {
-  const uint32_t start = from;
-  while (from < text.length() && XQueryIsWhiteSpace(text[from]) != whiteSpace) ++from;
-  checkUnits(from - start);
-  return from;
+template <class Unit>
+bool hasWhiteSpace(std::basic_string_view<Unit> text) {
+  bool found = false;
+  inBlocks(text, [&](std::basic_string_view<Unit> block) {
+    found = found || std::any_of(block.begin(), block.end(), XQueryIsWhiteSpace);
+  });
+  return found;
+}
+
+// Without white space at the ends, each inner run of it one space.
+template <class Unit>
+std::basic_string<Unit> collapsed(std::basic_string_view<Unit> text) {
+  std::basic_string<Unit> out;
+  out.reserve(text.size());
+  bool afterSpace = true;
+  inBlocks(text, [&](std::basic_string_view<Unit> block) {
+    for (const Unit unit : block) {
+      const bool space = XQueryIsWhiteSpace(unit);
+      if (!space) {
+        out += unit;
+      } else if (!afterSpace) {
+        out += static_cast<Unit>(' ');
+      }
+      afterSpace = space;
+    }
+  });
+  if (afterSpace && !out.empty()) out.pop_back();
+  return out;
 }
 
 }  // namespace
@@ -48,19 +73,9 @@ Ref<NSString> XQueryStringTrimLeadingWS(const Ref<NSString>& string) {
 
 Ref<NSString> XQueryNormalizeString(const Ref<NSString>& string) {
   const NSStringView text = string->view();
-  uint32_t end = nextWhiteSpace(text, 0, true);
-  if (end == text.length()) return string;
-  NSMutableString normalized;
-  uint32_t from = 0;
-  while (from < text.length()) {
-    if (end > from) {
-      if (normalized.length() > 0) normalized.append(u' ');
-      normalized.append(text.substring(from, end - from));
-    }
-    from = nextWhiteSpace(text, end, false);
-    end = nextWhiteSpace(text, from, true);
-  }
-  return normalized.string();
+  if (!withUnitsOf(text, [](auto units) { return hasWhiteSpace(units); })) return string;
+  return withUnitsOf(text,
+                     [](auto units) { return NSString::stringWithView(viewOf(collapsed(units))); });
 }
 
 void XQueryNormalizeAttributeString(NSMutableString& string) {

@@ -283,5 +283,34 @@ TEST(EscapeURI, TakesATextAndOneMore) {
   EXPECT_EQ(refusedCounts(fn_escape_uri, string("a")), "0 1 3 4 5");
 }
 
+// --- long texts ----------------------------------------------------------------------------------
+
+// Long texts are gone through in pieces, which must not show where they meet.
+TEST(StringMapping, LongTextsOfBothWidthsAreMappedAsShortOnesAre) {
+  for (const std::u16string_view piece : {u"aB \n/%#", u"a\u00E9 \n/%#"}) {
+    std::u16string text;
+    while (text.size() < 40000) text += piece;
+    const auto repeated = [&](XQueryProcedure procedure, std::vector<Value> arguments) {
+      const std::u16string once = unitsOf(answerOf(procedure, arguments));
+      std::u16string all;
+      while (all.size() < text.size() / piece.size() * once.size()) all += once;
+      arguments[0] = typedText(text);
+      EXPECT_EQ(unitsOf(answerOf(procedure, arguments)), all);
+    };
+    repeated(fn_upper_case, {typedText(piece)});
+    repeated(fn_lower_case, {typedText(piece)});
+    repeated(fn_translate, {typedText(piece), string("aB/"), string("xy")});
+    repeated(fn_escape_uri, {typedText(piece), boolean(true)});
+    std::u16string spaced;
+    for (std::u16string_view rest = text; !rest.empty(); rest.remove_prefix(piece.size())) {
+      spaced += std::u16string(piece.substr(0, 2)) + u" /%#";
+    }
+    EXPECT_EQ(unitsOf(answerOf(fn_normalize_space, {typedText(text)})), spaced);
+    EXPECT_EQ(unitsOf(answerOf(fn_normalize_space, {typedText(std::u16string(40000, u'x'))})),
+              std::u16string(40000, u'x'));
+    EXPECT_EQ(unitsOf(answerOf(fn_normalize_space, {typedText(std::u16string(40000, u' '))})), u"");
+  }
+}
+
 }  // namespace
 }  // namespace xquery

@@ -6,6 +6,7 @@
 #include <map>
 #include <random>
 #include <utility>
+#include <vector>
 
 namespace xquery {
 namespace {
@@ -82,6 +83,48 @@ TEST(ICUText, LongRunsOfMarksNormaliseAsShortOnesDo) {
     ASSERT_EQ(normalizedText(text, NSNormalizationForm::KC), composed);
     ASSERT_EQ(composed.substr(composed.size() - 2), u"\u00E9\uAC01");
   }
+}
+
+// Words that begin with a space neither change nor are changed by what is before them, so the
+// words' results, put together, are the text's.
+TEST(ICUText, ALongTextIsConvertedAsItsWordsAre) {
+  constexpr std::u16string_view units =
+      u"aZ\u03A3\u03A3\u00AD\u0301\u0323\u00E9\u1100\u1161\u11A8\uFB01\u0390\u00DF\xD801\xDC00"
+      u"\xD801\xDC28";
+  std::mt19937 random(3);
+  const auto wordByWord = [](const std::vector<std::u16string>& words, auto convert) {
+    std::u16string result;
+    for (const std::u16string& word : words) result += convert(word);
+    return result;
+  };
+  for (int round = 0; round < 20; ++round) {
+    std::u16string text;
+    std::vector<std::u16string> words;
+    while (text.size() < 30000) {
+      std::u16string word = u" ";
+      for (size_t length = random() % (round % 2 ? 90 : 9); length > 0; --length) {
+        word += units[random() % units.size()];
+      }
+      text += word;
+      words.push_back(word);
+    }
+    ASSERT_EQ(upperCasedText(text), wordByWord(words, upperCasedText));
+    ASSERT_EQ(lowerCasedText(text), wordByWord(words, lowerCasedText));
+    for (const NSNormalizationForm form : forms) {
+      ASSERT_EQ(normalizedText(text, form), wordByWord(words, [&](const std::u16string& word) {
+                  return normalizedText(word, form);
+                }));
+    }
+  }
+}
+
+TEST(ICUText, ALongTextWithoutAPlaceToCutIsConvertedWhole) {
+  const std::u16string sigmas(20000, u'\u03A3');
+  EXPECT_EQ(lowerCasedText(sigmas), std::u16string(19999, u'\u03C3') + u'\u03C2');
+  std::u16string pairs = u"a";
+  for (int index = 0; index < 10000; ++index) pairs += u"\xD801\xDC28";
+  EXPECT_EQ(lowerCasedText(upperCasedText(pairs)), pairs);
+  EXPECT_EQ(normalizedText(pairs, NSNormalizationForm::C), pairs);
 }
 
 // Each mark of the lower class belongs before all of the higher one.

@@ -1,0 +1,36 @@
+// A long text in pieces that are one step of work each, so that going through it can be ended.
+#pragma once
+
+#include "Platform/WorkMeter.h"
+#include "xquery/String.h"
+
+#include <string_view>
+
+namespace xquery {
+
+// Calls `work` with each piece in turn; of a text of one piece with the text itself.
+template <class Text, class Work>
+void inBlocks(std::basic_string_view<Text> text, Work work) {
+  constexpr size_t unitsPerBlock = 8192;
+  for (; text.size() > unitsPerBlock; text.remove_prefix(unitsPerBlock)) {
+    work(text.substr(0, unitsPerBlock));
+    checkWork();
+  }
+  work(text);
+}
+
+// The units of the text, in the width in which they are stored.
+template <class Work>
+auto withUnitsOf(NSStringView text, Work work) {
+  return text.isWide() ? work(std::u16string_view(text.wideUnits(), text.length()))
+                       : work(std::string_view(text.asciiUnits(), text.length()));
+}
+
+inline NSStringView viewOf(std::string_view ascii) {
+  return NSStringView::ascii(ascii);
+}
+inline NSStringView viewOf(std::u16string_view text) {
+  return {text.data(), static_cast<uint32_t>(text.size())};
+}
+
+}  // namespace xquery
