@@ -1,6 +1,8 @@
 #include "Functions/FunctionsSubstring.h"
 
 #include "Expr/XQueryArithmetic.h"
+#include "Expr/XQuerySequence.h"
+#include "Functions/FunctionsNumeric.h"
 #include "Functions/XQueryTextArgument.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"
@@ -32,24 +34,18 @@ Value truth(bool value) {
 // Far from any length of a string, and two of them add up within 64 bits.
 constexpr int64_t farAway = int64_t{1} << 62;
 
-// The number rounded to a whole one, halves up; nothing for NaN.
-std::optional<int64_t> roundedPosition(const NSNumber& number) {
-  if (XQueryIsNaN(number)) return std::nullopt;
-  switch (number.storage()) {
-    case NSNumber::Storage::Double:
-    case NSNumber::Storage::Float: {
-      const double value = number.doubleValue();
-      const double below = std::floor(value);
-      const double rounded = value - below >= 0.5 ? below + 1 : below;
-      constexpr auto limit = static_cast<double>(farAway);
-      return static_cast<int64_t>(std::clamp(rounded, -limit, limit));
-    }
-    case NSNumber::Storage::Decimal:
-      return std::clamp(number.decimalValue().rounded(0, NSRoundingMode::HalfUp).int64Value(),
-                        -farAway, farAway);
-    default:
-      return std::clamp(number.longLongValue(), -farAway, farAway);
+// The number rounded to a whole one; nothing for NaN and for the empty sequence. What is whole
+// already needs no rounding.
+std::optional<int64_t> roundedPosition(const Value& value, XQueryContext& context) {
+  if (isNull(value)) return std::nullopt;
+  const auto* exact = cast<NSNumber>(value)->storedDecimal();
+  if (exact && exact->isSmallInteger()) {
+    return std::clamp(exact->smallInteger(), -farAway, farAway);
   }
+  const Value rounded = xqround(value, 0, false, context);
+  const auto* number = cast<NSNumber>(rounded);
+  if (XQueryIsNaN(*number)) return std::nullopt;
+  return std::clamp(number->longLongValue(), -farAway, farAway);
 }
 
 // The units that a start and a length pick out of a text. Without a length it is as if that were
@@ -76,8 +72,8 @@ UnitRange rangeOfSubstring(uint32_t textLength, int64_t start, std::optional<int
   return {static_cast<uint32_t>(from), static_cast<uint32_t>(count)};
 }
 
-bool isInfinite(const NSNumber& number) {
-  return std::isinf(number.doubleValue());
+bool isInfinite(const Value& number) {
+  return std::isinf(cast<NSNumber>(number)->doubleValue());
 }
 
 }  // namespace
@@ -106,20 +102,15 @@ Value fn_substring(const Value* arguments, size_t count, XQueryContext& context)
   const Value start = XQueryPromoteToNumeric(arguments[1], context);
   const Value length = count == 3 ? XQueryPromoteToNumeric(arguments[2], context) : Value();
   const NSStringView text = cast<NSString>(source)->view();
-  // An empty start or length selects nothing, as a NaN does.
-  const auto* startNumber = dyn_cast<NSNumber>(start);
-  const std::optional<int64_t> from =
-      startNumber ? roundedPosition(*startNumber) : std::optional<int64_t>();
-  if (!from) return XQueryString::stringWithView({});
+  const std::optional<int64_t> from = roundedPosition(start, context);
+  // From minus infinity nothing can be reached, however long the part is.
+  if (!from || (*from < 0 && isInfinite(start))) return XQueryString::stringWithView({});
   std::optional<int64_t> units;
   if (count == 3) {
-    const auto* lengthNumber = dyn_cast<NSNumber>(length);
-    units = lengthNumber ? roundedPosition(*lengthNumber) : std::optional<int64_t>();
+    units = roundedPosition(length, context);
     if (!units) return XQueryString::stringWithView({});
-    if (*units > 0 && isInfinite(*lengthNumber)) units.reset();
+    if (*units > 0 && isInfinite(length)) units.reset();
   }
-  // From minus infinity nothing can be reached, however long the part is.
-  if (*from < 0 && isInfinite(*startNumber)) return XQueryString::stringWithView({});
   const UnitRange range = rangeOfSubstring(text.length(), *from, units);
   if (range.count == text.length()) return source;
   return XQueryString::stringWithView(text.substring(range.from, range.count));
