@@ -50,6 +50,7 @@ constexpr FunctionRow rows[] = {
     {"replace", "replace($list, '[0-9]+', '#')"},
     {"matches, constant pattern", "$words[matches(., '^[a-z]+[0-9]+$')]"},
     {"distinct-values", "distinct-values($words)"},
+    {"distinct-values, integers", "distinct-values($numbers)"},
     {"sum", "sum($numbers)"},
     {"index-of", "index-of($words, 'nowhere')"},
     {"deep-equal", "deep-equal($words, $others)"},

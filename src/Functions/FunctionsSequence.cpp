@@ -8,6 +8,7 @@
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
+#include "Types/XQueryString.h"
 #include "Types/XQueryTypeTable.h"
 #include "Types/XQueryValues.h"
 
@@ -142,7 +143,7 @@ Value fn_distinct_values(const Value* arguments, size_t count, XQueryContext& co
     // The text of an untyped item is the string's, so a repeated one needs no cast.
     if (!met.insert(*item)) continue;
     kept.push_back(XQueryObjectTypeID(item) == XQueryTypeUntypedAtomic
-                       ? XQueryCastAsTypeForContext(item, XQueryTypeString, context)
+                       ? Value(XQueryString::stringWithString(*cast<NSString>(item)))
                        : Value(item));
   }
   return normalised(sequenceOf(std::move(kept)));

@@ -23,7 +23,7 @@ uint64_t XQueryValueSet::ExactHash::operator()(const NSDecimal& value) const {
   return std::hash<std::string>()(value.toString());
 }
 
-uint64_t XQueryValueSet::ValueHash::operator()(const NSObject* value) const {
+size_t XQueryValueSet::ValueHash::operator()(const NSObject* value) const {
   return XQueryObjectHash(*value);
 }
 
@@ -34,7 +34,7 @@ bool XQueryValueSet::ValueEqual::operator()(const NSObject* a, const NSObject* b
 bool XQueryValueSet::insert(const NSObject& value) {
   if (const auto* string = dyn_cast<NSString>(&value)) return _strings.insert(string->view());
   if (const auto* number = dyn_cast<NSNumber>(&value)) return insertNumber(*number);
-  return _others.insert(&value);
+  return _others.insert(&value).second;
 }
 
 bool XQueryValueSet::insertNumber(const NSNumber& number) {
@@ -47,7 +47,8 @@ bool XQueryValueSet::insertNumber(const NSNumber& number) {
 
 bool XQueryValueSet::insertFloating(double value) {
   if (_floating.empty()) {
-    for (const auto& exact : _exact) _exactDoubles.insert(keyOf(exact.key.doubleValue()));
+    _exact.forEach(
+        [&](const NSDecimal& exact) { _exactDoubles.insert(keyOf(exact.doubleValue())); });
   }
   const uint64_t key = keyOf(value);
   return !_exactDoubles.contains(key) && _floating.insert(key);

@@ -21,8 +21,10 @@
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
+#include <cstddef>
 #include <cstdint>
 #include <functional>
+#include <unordered_set>
 
 namespace xquery {
 
@@ -35,8 +37,8 @@ class XQueryValueSet {
   struct TextHash {
     uint64_t operator()(NSStringView text) const { return text.hash(); }
   };
-  struct TextEqual {
-    bool operator()(NSStringView a, NSStringView b) const { return a.equals(b); }
+  struct TextLess {
+    bool operator()(NSStringView a, NSStringView b) const { return a.compare(b) < 0; }
   };
   struct ExactHash {
     uint64_t operator()(const NSDecimal& value) const;
@@ -44,8 +46,14 @@ class XQueryValueSet {
   struct ExactEqual {
     bool operator()(const NSDecimal& a, const NSDecimal& b) const { return a.compare(b) == 0; }
   };
+  struct ExactLess {
+    bool operator()(const NSDecimal& a, const NSDecimal& b) const { return a.compare(b) < 0; }
+  };
+  struct BitsHash {
+    uint64_t operator()(uint64_t bits) const { return bits; }
+  };
   struct ValueHash {
-    uint64_t operator()(const NSObject* value) const;
+    size_t operator()(const NSObject* value) const;
   };
   struct ValueEqual {
     bool operator()(const NSObject* a, const NSObject* b) const;
@@ -55,15 +63,14 @@ class XQueryValueSet {
   bool insertFloating(double value);
   bool insertExact(NSDecimal value);
 
-  struct BitsHash {
-    uint64_t operator()(uint64_t bits) const { return bits; }
-  };
+  using BitsSet = FlatSet<uint64_t, BitsHash, std::equal_to<>, std::less<>>;
 
-  FlatSet<NSStringView, TextHash, TextEqual> _strings;
-  FlatSet<NSDecimal, ExactHash, ExactEqual> _exact;
-  FlatSet<uint64_t, BitsHash, std::equal_to<>> _floating;      // doubles by their bits
-  FlatSet<uint64_t, BitsHash, std::equal_to<>> _exactDoubles;  // complete once there is a double
-  FlatSet<const NSObject*, ValueHash, ValueEqual> _others;
+  FlatSet<NSStringView, TextHash, std::equal_to<>, TextLess> _strings;
+  FlatSet<NSDecimal, ExactHash, ExactEqual, ExactLess> _exact;
+  BitsSet _floating;      // doubles by their bits
+  BitsSet _exactDoubles;  // complete once `_floating` holds anything
+  std::unordered_set<const NSObject*, ValueHash, ValueEqual, ValueAllocator<const NSObject*>>
+      _others;
 };
 
 }  // namespace xquery
