@@ -88,6 +88,16 @@ const std::vector<Work>& longWork() {
        "let $s := (1 to 1000000, 'a') for $k in 1 to 1000000 return typeswitch ($s) "
        "case xs:integer* return 1 case xs:string* return 2 default return 3"},
       {"Text", megabytes + "for $k in 1 to 1000000 return count(concat($s, $k))"},
+      {"MappingText",
+       megabytes + "for $k in 1 to 1000000 return count((upper-case($s), translate($s, 'a9', 'b'), "
+                   "normalize-space($s), escape-uri($s, true()), contains($s, 'fe'), "
+                   "string-join(($s, $s), $s)))"},
+      {"MappingWideText",
+       megabytes + "let $w := translate($s, '9', '&#233;') for $k in 1 to 1000000 return "
+                   "count((upper-case($w), lower-case($w), normalize-unicode($w, 'NFD'), "
+                   "translate($w, 'a', 'b'), escape-uri($w, false())))"},
+      {"Codepoints", megabytes + "for $k in 1 to 1000000 return "
+                                 "count(codepoints-to-string(string-to-codepoints($s)))"},
       {"ComparingText", megabytes + "let $t := concat($s, 'x') for $k in 1 to 1000000 where "
                                     "concat($s, 'y') = $t return $k"},
       {"CastingText", megabytes + "for $k in 1 to 1000000 return ($s castable as xs:integer, "
