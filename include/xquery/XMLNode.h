@@ -293,14 +293,14 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
   // Parses XML 1.0 with namespaces; null, with `error` filled when given, for input that is not
   // well formed. External entities and DTDs are never read. What internal entities and attribute
   // defaults add is bounded by the larger of 10 MiB and 20 times the input, the attributes of one
-  // tag by some 45,000; depth and the length of texts (below 4 Gi units) by memory only. Without
+  // tag by some 12,000; depth and the length of texts (below 4 Gi units) by memory only. Without
   // NSXMLNodePreserveWhitespace a text of white space only is dropped unless xml:space says
   // preserve.
   //
   // With NSXMLDocumentTidyHTML the bytes are HTML of any quality, in the encoding that they name.
   // What is missing is added: there is always html, head and body. Names are in lower case,
   // elements in the XHTML namespace, svg and math in their own. Nesting of more than some tens of
-  // thousands of levels, a tag of more than 20,000 attributes, and a text that takes time or memory
+  // thousands of levels, a tag of more than 1,600 attributes, and a text that takes time or memory
   // out of all proportion are refused, with 0 as the line.
   [[nodiscard]] static Ref<NSXMLDocument> documentWithData(std::string_view bytes, uint32_t options,
                                                            NSXMLParseError* error = nullptr);

@@ -36,7 +36,7 @@ uintptr_t lowestUsableAddress() {
 bool XQueryStackHasRoom() {
   WorkMeter& meter = workMeter;
   if (meter.stackLimit == UINTPTR_MAX) meter.stackLimit = lowestUsableAddress();
-  return reinterpret_cast<uintptr_t>(__builtin_frame_address(0)) > meter.stackLimit;
+  return XQueryStackAddress() > meter.stackLimit;
 }
 
 void XQueryCheckStackClosely(XQueryContext& context) {

@@ -18,13 +18,28 @@ bool XQueryStackHasRoom();
 // What XQueryCheckStack does when its two comparisons do not settle the matter.
 void XQueryCheckStackClosely(XQueryContext& context);
 
+// Where the stack ends at the moment. Asking for the frame's address instead would give every
+// caller a frame, even those whose last call is a jump.
+[[gnu::always_inline]] inline uintptr_t XQueryStackAddress() {
+#if defined(__x86_64__)
+  uintptr_t address;
+  __asm__("movq %%rsp, %0" : "=r"(address));
+  return address;
+#elif defined(__aarch64__)
+  uintptr_t address;
+  __asm__("mov %0, sp" : "=r"(address));
+  return address;
+#else
+  return reinterpret_cast<uintptr_t>(__builtin_frame_address(0));
+#endif
+}
+
 // For every call and every nested expression, once per evaluation of it: raises error 0 "limit:
 // expression nested too deeply" when too little stack is left, and counts a step of work, which
 // raises the error of the context's limit that is reached. A loop inside an expression whose turns
 // evaluate nothing has a WorkPacer besides.
 [[gnu::always_inline]] inline void XQueryCheckStack(XQueryContext& context) {
-  const auto frame = reinterpret_cast<uintptr_t>(__builtin_frame_address(0));
-  if (frame <= workMeter.stackLimit || --workMeter.stepsLeft <= 0) [[unlikely]] {
+  if (XQueryStackAddress() <= workMeter.stackLimit || --workMeter.stepsLeft <= 0) [[unlikely]] {
     XQueryCheckStackClosely(context);
   }
 }

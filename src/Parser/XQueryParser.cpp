@@ -141,8 +141,6 @@ size_t XQueryParser::remainingBytes() {
 
 size_t XQueryParser::readChars(size_t maxBytes, char* toBuffer) {
   const size_t count = std::min(maxBytes, remainingBytes());
-  constexpr size_t bytesPerStep = 64;
-  checkWork(count / bytesPerStep);
   std::memcpy(toBuffer, _utf8String.data() + _position, count);
   _position += count;
   return count;

@@ -103,6 +103,32 @@ const std::vector<Work>& longWork() {
       {"CastingText", megabytes + "for $k in 1 to 1000000 return ($s castable as xs:integer, "
                                   "$s castable as xs:NCName, $s castable as xs:hexBinary, "
                                   "$s castable as xs:base64Binary, $s castable as xs:token)"},
+      {"JoiningText",
+       strings + "for $k in 1 to 1000000 return string-length(string-join($s, $t[1]))"},
+      {"MappingText", megabytes + "for $k in 1 to 1000000 return (string-length(upper-case($s)), "
+                                  "string-length(translate($s, '0f', 'xy')), "
+                                  "string-length(normalize-space($s)))"},
+      {"SearchingText", megabytes + "for $k in 1 to 1000000 return (contains($s, 'fe'), "
+                                    "substring-before($s, 'fe'), ends-with($s, 'fe'))"},
+      {"Codepoints", megabytes + "for $k in 1 to 1000000 return count(string-to-codepoints($s))"},
+      {"Patterns", megabytes + "for $k in 1 to 1000000 return (matches($s, 'g'), "
+                               "string-length(replace($s, 'a', 'b')))"},
+      {"SlowPatterns", "let $s := '" + std::string(3000, 'a') +
+                           "' for $k in 1 to 1000000 return "
+                           "matches($s, '(a+)+b')"},
+      {"Tokens", megabytes + "for $k in 1 to 1000000 return count(tokenize($s, 'a'))"},
+      {"DeepEqual", "for $k in 1 to 1000000 return deep-equal(/, <x>{/}</x>/node())", Input::Wide},
+      {"Sequences",
+       "let $s := (1 to 1000000, 1) for $k in 1 to 1000000 return (count(reverse($s)), "
+       "count(subsequence($s, 5)), count(remove($s, 7)), count(index-of($s, 1)), "
+       "count(insert-before($s, 9, $s)))"},
+      {"Extremes",
+       "let $s := (1 to 1000000, 1) for $k in 1 to 1000000 return (max($s), min($s), "
+       "avg($s))"},
+      {"Joins", strings +
+                    "for $k in 1 to 1000000 return count(for $a in $s, $b in $t where $a = $b "
+                    "return 1)"},
+      {"Rounding", digits + "for $k in 1 to 1000000 return count(round($n div 7))"},
       {"Multiplying", digits + "for $k in 1 to 1000000 return count($n * $n)"},
       {"Dividing", digits + "for $k in 1 to 1000000 return count(($n * $n) idiv $n)"},
       {"Digits", digits + "for $k in 1 to 1000000 return count(xs:decimal(string($n)))"},
@@ -426,6 +452,10 @@ constexpr const char* explosions[] = {
     "distinct-values(for $i in 1 to 20000000 return concat('a', $i))",
     "for $i in 1 to 20000000 return xs:date('2004-01-01') + xdt:dayTimeDuration('P1D')",
     "(1 to 20000000)[. > 0]",
+    "string-join(for $i in 1 to 20000000 return 'abc', ',')",
+    "string-to-codepoints(string-join(for $i in 1 to 100000 return 'abcdefghij', ''))",
+    "declare function local:f($s) { local:f(replace($s, 'a', 'aaaaaaaa')) }; local:f('a')",
+    "declare function local:f($s) { local:f(reverse(($s, $s))) }; local:f((1, 2))",
 };
 
 class Explosions : public testing::TestWithParam<const char*> {};
