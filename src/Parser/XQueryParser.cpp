@@ -9,14 +9,52 @@
 #include <algorithm>
 #include <chrono>
 #include <climits>
+#include <condition_variable>
 #include <cstring>
 #include <exception>
+#include <mutex>
 #include <new>
 
 namespace xquery {
 namespace {
 
-std::timed_mutex sXQueryParserLock;
+// The process-wide lock. Whoever waits for it can be ended. It is made of a mutex and a condition
+// because ThreadSanitizer does not see every way in which the library locks a timed mutex.
+class ParserLock {
+ public:
+  void lock() {
+    constexpr std::chrono::milliseconds betweenLooks(20);
+    std::unique_lock guard(_mutex);
+    while (_isTaken) {
+      _released.wait_for(guard, betweenLooks);
+      if (!_isTaken) break;
+      guard.unlock();
+      lookAtWork();
+      guard.lock();
+    }
+    _isTaken = true;
+  }
+  void unlock() {
+    {
+      const std::lock_guard guard(_mutex);
+      _isTaken = false;
+    }
+    _released.notify_one();
+  }
+
+ private:
+  std::mutex _mutex;
+  std::condition_variable _released;
+  bool _isTaken = false;
+};
+
+ParserLock& parserLock() {
+  // Never destroyed: queries may be compiled by destructors that run at exit.
+  alignas(ParserLock) static unsigned char storage[sizeof(ParserLock)];
+  static ParserLock* const sXQueryParserLock = ::new (storage) ParserLock;
+  return *sXQueryParserLock;
+}
+
 XQueryParser* sXQueryParserCurrent = nullptr;
 unsigned sXQueryParserSetterFlags = 0;
 
@@ -62,10 +100,8 @@ Ref<NSString> currentSourceLine() {
 NSObject* yyparse_result = nullptr;
 
 // An evaluation that compiles a query may be ended while it waits for another thread's parse.
-XQueryParser::Session::Session(XQueryParser& parser)
-    : _lock(sXQueryParserLock, std::defer_lock), _parser(parser) {
-  constexpr std::chrono::milliseconds betweenLooks(20);
-  while (!_lock.try_lock_for(betweenLooks)) lookAtWork();
+XQueryParser::Session::Session(XQueryParser& parser) : _parser(parser) {
+  parserLock().lock();
   sXQueryParserCurrent = &parser;
   sXQueryParserSetterFlags = 0;
 }
@@ -76,6 +112,7 @@ XQueryParser::Session::~Session() {
   _parser._pool.clear();
   _parser._blocks.clear();
   sXQueryParserCurrent = nullptr;
+  parserLock().unlock();
 }
 
 Ref<XQueryParser> XQueryParser::unparsedParserWithSource(Ref<NSString> source) {

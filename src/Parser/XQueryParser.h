@@ -14,7 +14,6 @@
 
 #include <cstdint>
 #include <memory>
-#include <mutex>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -66,7 +65,6 @@ class XQueryParser : public NSCounted {
     Session& operator=(const Session&) = delete;
 
    private:
-    std::unique_lock<std::timed_mutex> _lock;
     XQueryParser& _parser;
   };
   // A parser that has not parsed, for driving the scanner alone.
