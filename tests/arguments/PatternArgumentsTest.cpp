@@ -5,21 +5,55 @@
 
 #include <gtest/gtest.h>
 
-#include <regex>
+#include <cctype>
+#include <optional>
+#include <utility>
 
 namespace xquery::arguments {
 namespace {
 
-// The pattern with its flags, of ASCII characters; null for flags that there are not. "x" has no
-// meaning for the patterns used with it.
-std::optional<std::regex> compiled(const std::string& pattern, const std::string& flags) {
-  auto options = std::regex::ECMAScript;
-  for (const char flag : flags) {
-    if (std::string_view("imsx").find(flag) == std::string_view::npos) return std::nullopt;
-    if (flag == 'i') options |= std::regex::icase;
+// A pattern of characters, of "." for any, of "?" after what may be missing, and of "$" for the
+// end.
+class Pattern {
+ public:
+  // Nothing for flags that there are not.
+  static std::optional<Pattern> with(const std::string& text, const std::string& flags) {
+    if (flags.find_first_not_of("imsx") != flags.npos) return std::nullopt;
+    return Pattern(text, flags.find('i') != flags.npos);
   }
-  return std::regex(pattern, options);
-}
+
+  // The first match from there on, as the places of its start and end.
+  std::optional<std::pair<size_t, size_t>> find(const std::string& text, size_t from) const {
+    for (size_t start = from; start <= text.size(); ++start) {
+      const size_t end = matchedTo(text, start, 0);
+      if (end != std::string::npos) return std::pair(start, end);
+    }
+    return std::nullopt;
+  }
+
+ private:
+  Pattern(std::string text, bool ignoresCase) : _text(std::move(text)), _ignoresCase(ignoresCase) {}
+
+  bool isOne(char c, char wanted) const {
+    if (wanted == '.' || c == wanted) return true;
+    return _ignoresCase && std::isalpha(c) && std::isalpha(wanted) && (c | 32) == (wanted | 32);
+  }
+
+  size_t matchedTo(const std::string& text, size_t at, size_t place) const {
+    if (place == _text.size()) return at;
+    if (_text[place] == '$') {
+      return at == text.size() ? matchedTo(text, at, place + 1) : std::string::npos;
+    }
+    const bool isOptional = place + 1 < _text.size() && _text[place + 1] == '?';
+    const size_t next = place + (isOptional ? 2 : 1);
+    size_t end = std::string::npos;
+    if (at < text.size() && isOne(text[at], _text[place])) end = matchedTo(text, at + 1, next);
+    return end == std::string::npos && isOptional ? matchedTo(text, at, next) : end;
+  }
+
+  std::string _text;
+  bool _ignoresCase;
+};
 
 struct Texts {
   std::string input;
@@ -36,7 +70,7 @@ Texts read(const Call& call, size_t plain) {
   }
   if (attempt.haveFailed()) {
     // What makes the answer certain may come first.
-    const bool isNoFlag = call.count() > plain && !compiled("a", texts[plain]);
+    const bool isNoFlag = call.count() > plain && !Pattern::with("", texts[plain]);
     if (isNoFlag) call.orRefused();
     if (texts[0].empty()) call.orElse("9 ");
   }
@@ -46,32 +80,28 @@ Texts read(const Call& call, size_t plain) {
 }
 
 // The whole matches of the text, as places; refused when one of them is empty.
-std::vector<std::pair<size_t, size_t>> places(const std::string& text, const std::regex& pattern) {
+std::vector<std::pair<size_t, size_t>> places(const std::string& text, const Pattern& pattern) {
   std::vector<std::pair<size_t, size_t>> all;
   size_t from = 0;
-  std::smatch match;
-  while (
-      std::regex_search(text.begin() + static_cast<ptrdiff_t>(from), text.end(), match, pattern)) {
-    const size_t start = from + static_cast<size_t>(match.position());
-    const size_t end = start + static_cast<size_t>(match.length());
-    if (end == from) throw Refused();
-    all.emplace_back(start, end);
-    from = end;
+  while (const auto place = pattern.find(text, from)) {
+    if (place->second == from) throw Refused();
+    all.push_back(*place);
+    from = place->second;
   }
   return all;
 }
 
 Sequence matches(const Call& call) {
   const Texts texts = read(call, 2);
-  const auto pattern = compiled(texts.pattern, texts.flags);
+  const auto pattern = Pattern::with(texts.pattern, texts.flags);
   if (!pattern) throw Refused();
-  return one(boolean(std::regex_search(texts.input, *pattern)));
+  return one(boolean(pattern->find(texts.input, 0).has_value()));
 }
 
 Sequence tokenize(const Call& call) {
   const Texts texts = read(call, 2);
   if (texts.input.empty()) return one(string(""));
-  const auto pattern = compiled(texts.pattern, texts.flags);
+  const auto pattern = Pattern::with(texts.pattern, texts.flags);
   if (!pattern) throw Refused();
   Sequence pieces;
   size_t from = 0;
@@ -91,7 +121,7 @@ std::string expanded(const std::string& replacement) {
 
 Sequence replace(const Call& call) {
   const Texts texts = read(call, 3);
-  const auto pattern = compiled(texts.pattern, texts.flags);
+  const auto pattern = Pattern::with(texts.pattern, texts.flags);
   if (!pattern) throw Refused();
   std::string result;
   size_t from = 0;
