@@ -3,6 +3,7 @@
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryTextArgument.h"
 #include "Platform/ICUText.h"
+#include "Platform/TextBlocks.h"
 #include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
@@ -43,11 +44,11 @@ std::optional<int32_t> codePointOf(const Value& item, XQueryContext& context) {
 Value stringOf(const std::vector<int32_t>& points, bool ascii) {
   if (ascii) {
     const std::string text(points.begin(), points.end());
-    return XQueryString::stringWithView(NSStringView::ascii(text));
+    return XQueryString::stringWithView(viewOf(text));
   }
   const auto text = textWithCodePoints(points);
   if (!text) return Value();
-  return XQueryString::stringWithView({text->data(), static_cast<uint32_t>(text->size())});
+  return XQueryString::stringWithView(viewOf(*text));
 }
 
 template <class Units>

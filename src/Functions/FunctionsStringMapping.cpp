@@ -6,6 +6,7 @@
 #include "Functions/XQueryTextArgument.h"
 #include "Platform/ICUText.h"
 #include "Platform/TextBlocks.h"
+#include "Platform/UTF16.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"
@@ -173,20 +174,6 @@ std::string percentEscaped(std::string_view utf8, const UnescapedSet& unescaped)
     }
   });
   return out;
-}
-
-bool hasLoneSurrogate(NSStringView text) {
-  if (!text.isWide()) return false;
-  WorkPacer pacer;
-  for (uint32_t index = 0; index < text.length(); ++index) {
-    pacer.turn();
-    const char16_t unit = text[index];
-    if (unit < 0xD800 || unit > 0xDFFF) continue;
-    const char16_t next = index + 1 < text.length() ? text[index + 1] : u'\0';
-    if (unit > 0xDBFF || next < 0xDC00 || next > 0xDFFF) return true;
-    ++index;
-  }
-  return false;
 }
 
 }  // namespace

@@ -1,6 +1,7 @@
 #include "Functions/XQueryRegEx.h"
 
 #include "Expr/XQuerySequence.h"
+#include "Platform/UTF16.h"
 #include "Platform/UTF8.h"
 #include "Platform/WorkMeter.h"
 #include "xquery/Number.h"
@@ -67,20 +68,6 @@ void translateReferences(std::string& pattern) {
 
 // --- subjects ------------------------------------------------------------------------------------
 
-bool hasLoneSurrogate(NSStringView text) {
-  if (!text.isWide()) return false;
-  const char16_t* const units = text.wideUnits();
-  for (uint32_t index = 0; index < text.length(); ++index) {
-    const char16_t unit = units[index];
-    if (unit < 0xD800 || unit > 0xDFFF) continue;
-    const bool pair = unit < 0xDC00 && index + 1 < text.length() && units[index + 1] >= 0xDC00 &&
-                      units[index + 1] <= 0xDFFF;
-    if (!pair) return true;
-    ++index;
-  }
-  return false;
-}
-
 // The UTF-8 form of a text: its own units when they are 8-bit. The text must outlive it.
 class UTF8Form {
  public:
@@ -89,7 +76,6 @@ class UTF8Form {
       _bytes = {text.asciiUnits(), text.length()};
       return;
     }
-    checkWork(text.length() / bytesPerStep);
     _wellFormed = !hasLoneSurrogate(text);
     if (_wellFormed) _converted = text.utf8();
     _bytes = _converted;
@@ -115,13 +101,7 @@ class UTF8Form {
     const auto* next = reinterpret_cast<const unsigned char*>(text.data());
     const auto* const end = next + text.size();
     while (next < end) {
-      const char32_t point = readUTF8(next, end);
-      if (point >= 0x10000) {
-        _units += static_cast<char16_t>(0xD800 + ((point - 0x10000) >> 10));
-        _units += static_cast<char16_t>(0xDC00 + ((point - 0x10000) & 0x3FF));
-      } else {
-        _units += static_cast<char16_t>(point);
-      }
+      appendUTF16(_units, readUTF8(next, end));
     }
     out.append({_units.data(), static_cast<uint32_t>(_units.size())});
   }
@@ -139,20 +119,21 @@ class UTF8Form {
 // The matches from left to right, each search beginning where the last match ended.
 class MatchWalk {
  public:
-  enum class Step { Match, End, Failure };
+  MatchWalk(RegExpCode& code, std::string_view text) : _search(code, text) {}
 
-  MatchWalk(RegExpCode& code, std::string_view text) : _search(code, text), _text(text) {}
-
-  Step next() {
+  // Moves on to the next match; false when there is none or the walk failed.
+  bool next() {
     _position = _match.end;
     const PCRESearch::Outcome outcome = _search.find(_position, PCRENoUTF8Check);
-    if (outcome == PCRESearch::Outcome::NotFound) return Step::End;
-    if (outcome == PCRESearch::Outcome::Failed) return Step::Failure;
-    _match = _search.group(0);
+    if (outcome == PCRESearch::Outcome::NotFound) return false;
+    if (outcome == PCRESearch::Outcome::Found) _match = _search.group(0);
     // A \K in a lookaround can put the start before the position or behind the end.
-    if (_match.start < _position || _match.start > _match.end) return Step::Failure;
-    return _match.end == _position ? Step::Failure : Step::Match;
+    _failed = outcome == PCRESearch::Outcome::Failed || _match.end == _position ||
+              _match.start < _position || _match.start > _match.end;
+    return !_failed;
   }
+
+  bool failed() const { return _failed; }
 
   // Where the search for the match began: the text from here to its start is between matches.
   size_t position() const { return _position; }
@@ -161,9 +142,9 @@ class MatchWalk {
 
  private:
   PCRESearch _search;
-  const std::string_view _text;
   size_t _position = 0;
   PCRERange _match = {0, 0};
+  bool _failed = false;
 };
 
 // --- replacements --------------------------------------------------------------------------------
@@ -302,16 +283,8 @@ Value XQueryRegEx::matches(const NSString* string) const {
   if (!subject.wellFormed()) return Value();
   MatchWalk walk(*_compiled, subject.bytes());
   XQueryGatherer found;
-  while (true) {
-    switch (walk.next()) {
-      case MatchWalk::Step::Failure:
-        return Value();
-      case MatchWalk::Step::End:
-        return found.value();
-      case MatchWalk::Step::Match:
-        found.add(subject.piece(walk.match().start, walk.match().end));
-    }
-  }
+  while (walk.next()) found.add(subject.piece(walk.match().start, walk.match().end));
+  return walk.failed() ? Value() : found.value();
 }
 
 Value XQueryRegEx::replace(const NSString* string, NSStringView withString) const {
@@ -321,23 +294,18 @@ Value XQueryRegEx::replace(const NSString* string, NSStringView withString) cons
   const Replacement replacement(withString);
   MatchWalk walk(*_compiled, subject.bytes());
   NSMutableString result;
-  while (true) {
-    switch (walk.next()) {
-      case MatchWalk::Step::Failure:
-        return Value();
-      case MatchWalk::Step::End:
-        // Without a match the text is the string's own.
-        if (walk.position() == 0) return make<NSString>(Kind::String, uint16_t{0}, *string);
-        subject.append(walk.position(), subject.bytes().size(), result);
-        return result.string();
-      case MatchWalk::Step::Match:
-        if (!replacement.valid()) return Value();
-        subject.append(walk.position(), walk.match().start, result);
-        const uint32_t length = result.length();
-        replacement.append(walk, subject, result);
-        checkWork((result.length() - length) / bytesPerStep);
-    }
+  while (walk.next()) {
+    if (!replacement.valid()) return Value();
+    subject.append(walk.position(), walk.match().start, result);
+    const uint32_t length = result.length();
+    replacement.append(walk, subject, result);
+    checkWork((result.length() - length) / bytesPerStep);
   }
+  if (walk.failed()) return Value();
+  // Without a match the text is the string's own.
+  if (walk.position() == 0) return make<NSString>(Kind::String, uint16_t{0}, *string);
+  subject.append(walk.position(), subject.bytes().size(), result);
+  return result.string();
 }
 
 Value XQueryRegEx::tokenize(const NSString* string) const {
@@ -346,17 +314,10 @@ Value XQueryRegEx::tokenize(const NSString* string) const {
   if (!subject.wellFormed()) return Value();
   MatchWalk walk(*_compiled, subject.bytes());
   XQueryGatherer pieces;
-  while (true) {
-    switch (walk.next()) {
-      case MatchWalk::Step::Failure:
-        return Value();
-      case MatchWalk::Step::End:
-        pieces.add(subject.piece(walk.position(), subject.bytes().size()));
-        return pieces.value();
-      case MatchWalk::Step::Match:
-        pieces.add(subject.piece(walk.position(), walk.match().start));
-    }
-  }
+  while (walk.next()) pieces.add(subject.piece(walk.position(), walk.match().start));
+  if (walk.failed()) return Value();
+  pieces.add(subject.piece(walk.position(), subject.bytes().size()));
+  return pieces.value();
 }
 
 }  // namespace xquery

@@ -5,6 +5,7 @@
 //   InTree   in the arena of a tree, which `owner` keeps alive
 //   Shared   in the buffer of another string, which `owner` keeps alive
 //   none     in a buffer of its own
+#include "Platform/UTF16.h"
 #include "Platform/UTF8.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
@@ -48,16 +49,6 @@ uint32_t checkedLength(size_t length) {
   return static_cast<uint32_t>(length);
 }
 
-template <class Text>
-void appendPoint(Text& out, char32_t point) {
-  if (point < 0x10000) {
-    out += static_cast<char16_t>(point);
-  } else {
-    out += static_cast<char16_t>(0xD800 + ((point - 0x10000) >> 10));
-    out += static_cast<char16_t>(0xDC00 + ((point - 0x10000) & 0x3FF));
-  }
-}
-
 // False when the text is not well formed and `replacing` is not asked for.
 bool decodeUTF8(std::string_view text, bool replacing, std::u16string& out) {
   out.reserve(text.size());
@@ -66,7 +57,7 @@ bool decodeUTF8(std::string_view text, bool replacing, std::u16string& out) {
   while (next < end) {
     const char32_t point = readUTF8(next, end);
     if (point != invalidCodePoint) {
-      appendPoint(out, point);
+      appendUTF16(out, point);
     } else if (replacing) {
       out += replacementCharacter;
     } else {
@@ -223,7 +214,7 @@ void NSMutableString::appendCodePoint(char32_t point) {
   }
   checkedLength(size_t{length()} + 2);
   if (!_isWide) widen();
-  appendPoint(_wide, point);
+  appendUTF16(_wide, point);
 }
 
 void NSMutableString::widen() {

@@ -2,6 +2,7 @@
 //
 // Both representations give the same answers. 8-bit text against 8-bit text, the common case, goes
 // through the C library's byte functions; the other pairings share one implementation per question.
+#include "Platform/UTF16.h"
 #include "Platform/WorkMeter.h"
 #include "xquery/String.h"
 
@@ -12,13 +13,6 @@
 namespace xquery {
 
 namespace {
-
-bool isHighSurrogate(char16_t unit) {
-  return unit >= 0xD800 && unit < 0xDC00;
-}
-bool isLowSurrogate(char16_t unit) {
-  return unit >= 0xDC00 && unit < 0xE000;
-}
 
 // After so many units were looked at: only long texts are work of their own.
 void checkUnits(uint32_t count) {
@@ -68,15 +62,6 @@ uint32_t firstDifference(const UnitA* a, const UnitB* b, uint32_t length) {
   }
   while (index < length && widened(a[index]) == widened(b[index])) ++index;
   return index;
-}
-
-// The code point that begins at `index`; a lone surrogate is itself.
-char32_t codePointAt(NSStringView text, uint32_t index) {
-  const char16_t high = text[index];
-  if (!isHighSurrogate(high) || index + 1 >= text.length()) return high;
-  const char16_t low = text[index + 1];
-  if (!isLowSurrogate(low)) return high;
-  return 0x10000 + ((char32_t{high} - 0xD800U) << 10) + (low - 0xDC00U);
 }
 
 // Knuth, Morris and Pratt's search: linear whatever the texts are, so that a hostile pattern

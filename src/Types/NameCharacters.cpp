@@ -2,6 +2,8 @@
 // membership test is one load from read-only memory and needs no first-use guard.
 #include "Types/NameCharacters.h"
 
+#include "Platform/UTF16.h"
+
 #include <span>
 
 namespace xquery {
@@ -171,12 +173,9 @@ bool isIn(std::span<const WideRange> ranges, uint32_t character) {
 
 // The character at the index, which is moved past it; half a surrogate pair is one by itself.
 uint32_t nextCharacter(NSStringView text, uint32_t& index) {
-  const char16_t unit = text[index++];
-  if (unit < 0xD800 || unit > 0xDBFF || index == text.length()) return unit;
-  const char16_t low = text[index];
-  if (low < 0xDC00 || low > 0xDFFF) return unit;
-  ++index;
-  return 0x10000 + ((unit - 0xD800U) << 10) + (low - 0xDC00U);
+  const char32_t character = codePointAt(text, index);
+  index += character >= 0x10000 ? 2 : 1;
+  return character;
 }
 
 }  // namespace
