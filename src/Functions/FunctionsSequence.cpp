@@ -191,7 +191,7 @@ Value fn_subsequence(const Value* arguments, size_t count, XQueryContext& contex
   const int64_t first = std::max<int64_t>(start, 1) - 1;
   if (length < 1 || first >= available) return NSNull::null();
   const int64_t taken = std::min(length, available - first);
-  if (taken == available) return arguments[0];
+  if (taken == available) return normalised(arguments[0]);
   Items chosen;
   chosen.reserve(static_cast<size_t>(taken));
   append(items, static_cast<size_t>(first), static_cast<size_t>(taken), chosen);

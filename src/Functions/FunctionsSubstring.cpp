@@ -72,8 +72,10 @@ UnitRange rangeOfSubstring(uint32_t textLength, int64_t start, std::optional<int
   return {static_cast<uint32_t>(from), static_cast<uint32_t>(count)};
 }
 
-bool isInfinite(const Value& number) {
-  return std::isinf(cast<NSNumber>(number)->doubleValue());
+// A decimal is finite, also one beyond the range of doubles.
+bool isInfinite(const Value& value) {
+  const NSNumber& number = *cast<NSNumber>(value);
+  return !number.storedDecimal() && std::isinf(number.doubleValue());
 }
 
 }  // namespace
@@ -112,7 +114,8 @@ Value fn_substring(const Value* arguments, size_t count, XQueryContext& context)
     if (*units > 0 && isInfinite(length)) units.reset();
   }
   const UnitRange range = rangeOfSubstring(text.length(), *from, units);
-  if (range.count == text.length()) return source;
+  // To its end the whole source is answered as it is; a part of given length is an xs:string.
+  if (!units && range.count == text.length()) return source;
   return XQueryString::stringWithView(text.substring(range.from, range.count));
 }
 

@@ -232,6 +232,25 @@ TEST(Substring, FarAwayNumbersAreSafe) {
   EXPECT_EQ(part(integer(3), decimal("99999999999999999999")), "string 345");
 }
 
+TEST(Substring, ADecimalBeyondDoublesIsNoInfinity) {
+  const std::string digits(400, '9');
+  EXPECT_EQ(part(decimal("-" + digits)), "string 12345");
+  EXPECT_EQ(part(decimal("-" + digits), infinity()), "string 12345");
+  EXPECT_EQ(part(integer(3), decimal(digits)), "string 345");
+}
+
+TEST(Substring, OnlyTheWholeSourceToItsEndKeepsItsType) {
+  const auto tokenPart = [](std::vector<Value> bounds) {
+    bounds.insert(bounds.begin(), typed(XQueryTypeToken, "12345"));
+    return call(fn_substring, bounds);
+  };
+  EXPECT_EQ(tokenPart({integer(1)}), "token 12345");
+  EXPECT_EQ(tokenPart({integer(0), infinity()}), "token 12345");
+  EXPECT_EQ(tokenPart({integer(2)}), "string 2345");
+  EXPECT_EQ(tokenPart({integer(1), integer(4)}), "string 1234");
+  EXPECT_EQ(tokenPart({integer(1), integer(5)}), "string 12345");
+}
+
 TEST(Substring, AnEmptyStartOrLengthGivesNothing) {
   EXPECT_EQ(part(empty()), "string ");
   EXPECT_EQ(part(empty(), integer(1)), "string ");
