@@ -273,7 +273,6 @@ Value XQueryRegEx::hasMatch(const NSString* string) const {
   const UTF8Form subject(string->view());
   if (!subject.wellFormed()) return NSNumber::numberWithBool(false);
   const auto outcome = PCRESearch(*_compiled, subject.bytes()).find(0, PCRENoUTF8Check);
-  if (outcome == PCRESearch::Outcome::Failed) return Value();
   return NSNumber::numberWithBool(outcome == PCRESearch::Outcome::Found);
 }
 

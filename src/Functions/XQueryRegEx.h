@@ -52,10 +52,11 @@ class XQueryRegEx : public NSCounted {
   uint32_t flags() const { return _flags; }
   size_t byteCount() const { return _compiled->byteCount(); }
 
-  // True or false, which is also the answer for a missing string or one with lone surrogates; none
-  // when the search is too expensive.
+  // False also for a missing string, one with lone surrogates, and where the search is given up as
+  // too expensive: the test always has an answer.
   Value hasMatch(const NSString* string) const;
-  // The rest answer none as well where a match is empty and begins where the last one ended.
+  // The rest answer none in these cases, and where a match is empty and begins where the last one
+  // ended.
   //
   // The whole matches from left to right: the empty sequence, a string, or an array.
   Value matches(const NSString* string) const;

@@ -76,11 +76,15 @@ TEST(RegExFunctions, ALoopCompilesItsPatternOnce) {
   EXPECT_EQ(context->_internal().regExCache().count(), 2U);
 }
 
-TEST(RegExFunctions, ARunawayPatternIsRefusedWithinASecond) {
+TEST(RegExFunctions, ARunawayPatternIsGivenUpWithinASecond) {
+  const std::string text = "'aaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaab'";
   const std::clock_t start = std::clock();
-  EXPECT_EQ(answer("matches('aaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaab', '(a+)+$')"),
-            "error 17 line 1 invalid arguments to function - matches");
+  EXPECT_EQ(answer("matches(" + text + ", '(a+)+$')"), "false");
   EXPECT_LT(static_cast<double>(std::clock() - start) / CLOCKS_PER_SEC, 1.0);
+  EXPECT_EQ(answer("replace(" + text + ", '(a+)+$', '')"),
+            "error 17 line 1 invalid arguments to function - replace");
+  EXPECT_EQ(answer("tokenize(" + text + ", '(a+)+$')"),
+            "error 17 line 1 invalid arguments to function - tokenize");
 }
 
 std::string limited(const std::string& source, XQueryLimits limits) {
