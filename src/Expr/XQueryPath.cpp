@@ -214,8 +214,10 @@ void XQueryAxisStep::enter(NSXMLNode* node, XQueryPathRun& run) const {
 void XQueryAxisStep::stream(int axis, NSXMLNode* node, XQueryPathRun& run) const {
   XQueryNodeTest test(_expr.get(), run);
   if (const NSXMLExpandedName* name = test.onlyName()) {
-    streamMatching(axis, node, run,
-                   [name](const NSXMLNode* found) { return found->expandedName() == name; });
+    streamMatching(axis, node, run, [name](const NSXMLNode* found) {
+      const bool isNamed = found->kind() == Kind::Element || found->kind() == Kind::Attribute;
+      return isNamed && found->expandedName() == name;
+    });
   } else {
     streamMatching(axis, node, run,
                    [&test](const NSXMLNode* found) { return test.matches(found); });
