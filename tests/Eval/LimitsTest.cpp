@@ -105,12 +105,8 @@ const std::vector<Work>& longWork() {
                                   "$s castable as xs:base64Binary, $s castable as xs:token)"},
       {"JoiningText",
        strings + "for $k in 1 to 1000000 return string-length(string-join($s, $t[1]))"},
-      {"MappingText", megabytes + "for $k in 1 to 1000000 return (string-length(upper-case($s)), "
-                                  "string-length(translate($s, '0f', 'xy')), "
-                                  "string-length(normalize-space($s)))"},
       {"SearchingText", megabytes + "for $k in 1 to 1000000 return (contains($s, 'fe'), "
                                     "substring-before($s, 'fe'), ends-with($s, 'fe'))"},
-      {"Codepoints", megabytes + "for $k in 1 to 1000000 return count(string-to-codepoints($s))"},
       {"Patterns", megabytes + "for $k in 1 to 1000000 return (matches($s, 'g'), "
                                "string-length(replace($s, 'a', 'b')))"},
       {"SlowPatterns", "let $s := '" + std::string(3000, 'a') +
