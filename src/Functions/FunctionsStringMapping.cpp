@@ -82,18 +82,23 @@ class TranslationTable {
  public:
   TranslationTable(NSStringView map, NSStringView translation) {
     _ascii.fill(kept);
+    // Of several entries for one unit the first holds, so the table is small however long the map.
+    std::vector<bool> met(map.isWide() ? 0x10000 : _ascii.size());
+    WorkPacer pacer;
     for (uint32_t index = 0; index < map.length(); ++index) {
+      pacer.turn();
       const char16_t unit = map[index];
+      if (met[unit]) continue;
+      met[unit] = true;
       const int32_t target = index < translation.length() ? translation[index] : removed;
-      if (unit >= _ascii.size()) {
-        _others.push_back({unit, target});
-      } else if (_ascii[unit] == kept) {
+      if (unit < _ascii.size()) {
         _ascii[unit] = target;
+      } else {
+        _others.push_back({unit, target});
       }
     }
-    // Of several entries for one unit the first holds; a stable sort leaves it first.
-    std::stable_sort(_others.begin(), _others.end(),
-                     [](const Entry& a, const Entry& b) { return a.unit < b.unit; });
+    std::sort(_others.begin(), _others.end(),
+              [](const Entry& a, const Entry& b) { return a.unit < b.unit; });
   }
 
   // The text in units that hold every unit of the text and of the translation.
