@@ -4,6 +4,7 @@
 #include "Expr/XQueryNumericOperand.h"
 #include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
+#include "Functions/XQueryTextArgument.h"
 #include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
@@ -45,8 +46,7 @@ Value sumOf(const Value& sequence, XQueryContext& context) {
 
 Value extremeOf(const Value* arguments, size_t count, int comparison, XQueryContext& context) {
   if (count < 1 || count > 2) return Value();
-  // Promoted, so that a wrong collation is an error; it has no other effect.
-  if (count == 2) XQueryPromoteToString(arguments[1], context);
+  XQueryCheckCollation(arguments, count, 1, context);
   const Value& sequence = arguments[0];
   if (XQueryItemList(sequence.get()).count() == 0) return NSNull::null();
   if (Value extreme = XQueryExtremeShortcut(sequence, comparison)) return extreme;

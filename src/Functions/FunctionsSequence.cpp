@@ -2,6 +2,7 @@
 
 #include "Expr/XQuerySequence.h"
 #include "Functions/FunctionsNumeric.h"
+#include "Functions/XQueryTextArgument.h"
 #include "Functions/XQueryValueSet.h"
 #include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
@@ -110,12 +111,11 @@ Value fn_unordered(const Value* arguments, size_t count, XQueryContext&) {
   return count == 1 ? arguments[0] : Value();
 }
 
-// The value searched for is taken as it is: a node equals no atomic value. The collation is
-// promoted, so that a wrong one is an error, and has no other effect.
+// The value searched for is taken as it is: a node equals no atomic value.
 Value fn_index_of(const Value* arguments, size_t count, XQueryContext& context) {
   if (count < 2 || count > 3) return Value();
   const Value values = XQueryAtomization(arguments[0], context);
-  if (count == 3) XQueryPromoteToString(arguments[2], context);
+  XQueryCheckCollation(arguments, count, 2, context);
   const XQueryItemList items(values.get());
   const NSObject& wanted = *arguments[1];
   Items positions;
@@ -128,11 +128,10 @@ Value fn_index_of(const Value* arguments, size_t count, XQueryContext& context) 
   return normalised(sequenceOf(std::move(positions)));
 }
 
-// The first of each value, in input order. An untyped item becomes a string. The collation is
-// promoted, so that a wrong one is an error, and has no other effect.
+// The first of each value, in input order. An untyped item becomes a string.
 Value fn_distinct_values(const Value* arguments, size_t count, XQueryContext& context) {
   if (count < 1 || count > 2) return Value();
-  if (count == 2) XQueryPromoteToString(arguments[1], context);
+  XQueryCheckCollation(arguments, count, 1, context);
   const Value values = XQueryAtomization(arguments[0], context);
   const XQueryItemList items(values.get());
   XQueryValueSet met;

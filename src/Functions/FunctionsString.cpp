@@ -67,7 +67,7 @@ Value joinedNarrow(const NSArray& items, NSStringView separator, size_t length) 
 
 Value fn_compare(const Value* arguments, size_t count, XQueryContext& context) {
   if (count < 2 || count > 3) return Value();
-  if (count == 3) XQueryTextArgument(arguments[2], context);
+  XQueryCheckCollation(arguments, count, 2, context);
   for (size_t index = 0; index < 2; ++index) {
     if (XQueryItemList(arguments[index].get()).count() == 0) return NSNull::null();
   }

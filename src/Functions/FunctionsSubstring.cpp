@@ -21,7 +21,7 @@ Value withTwoTexts(const Value* arguments, size_t count, XQueryContext& context,
   if (count < 2 || count > 3) return Value();
   const XQueryTextArgument text(arguments[0], context);
   const XQueryTextArgument part(arguments[1], context);
-  if (count == 3) XQueryTextArgument(arguments[2], context);
+  XQueryCheckCollation(arguments, count, 2, context);
   return function(text.view(), part.view());
 }
 

@@ -14,6 +14,11 @@ XQueryTextArgument::XQueryTextArgument(const Value& argument, XQueryContext& con
   }
 }
 
+void XQueryCheckCollation(const Value* arguments, size_t count, size_t index,
+                          XQueryContext& context) {
+  if (index < count) XQueryPromoteToString(arguments[index], context);
+}
+
 Value XQueryArgumentOrContextItem(const Value* arguments, size_t count, XQueryContext& context) {
   if (count > 1) return Value();
   return count == 1 ? arguments[0] : context._internal().contextItem();

@@ -26,6 +26,11 @@ class XQueryTextArgument {
   Ref<NSString> _promoted;  // where the text could not be read in place
 };
 
+// The optional argument at the index names a collation: it must be a string, and has no effect,
+// since all texts are ordered by code point.
+void XQueryCheckCollation(const Value* arguments, size_t count, size_t index,
+                          XQueryContext& context);
+
 // The only argument, or the context item without one. Null when there is neither, and for more
 // arguments than one.
 Value XQueryArgumentOrContextItem(const Value* arguments, size_t count, XQueryContext& context);
