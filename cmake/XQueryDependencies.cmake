@@ -5,6 +5,7 @@ find_package(PkgConfig REQUIRED)
 find_package(Threads REQUIRED)
 find_package(LibXml2 REQUIRED)
 find_package(ICU REQUIRED COMPONENTS uc i18n)
+pkg_check_modules(XSLT REQUIRED IMPORTED_TARGET libxslt)
 pkg_check_modules(GMP REQUIRED IMPORTED_TARGET gmp)
 pkg_check_modules(CURL REQUIRED IMPORTED_TARGET libcurl)
 pkg_check_modules(TIDY REQUIRED IMPORTED_TARGET tidy)
@@ -13,5 +14,5 @@ pkg_check_modules(URIPARSER REQUIRED IMPORTED_TARGET liburiparser)
 
 add_library(xquery_dependencies INTERFACE)
 target_link_libraries(xquery_dependencies INTERFACE
-  LibXml2::LibXml2 ICU::i18n ICU::uc PkgConfig::GMP PkgConfig::PCRE2
+  LibXml2::LibXml2 PkgConfig::XSLT ICU::i18n ICU::uc PkgConfig::GMP PkgConfig::PCRE2
   PkgConfig::URIPARSER PkgConfig::CURL PkgConfig::TIDY Threads::Threads)

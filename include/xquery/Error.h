@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <string_view>
 
 namespace xquery {
 
@@ -24,16 +25,22 @@ class XQUERY_EXPORT NSError : public NSCounted {
     std::optional<int64_t> errorLine;  // key "ErrorLine"
   };
 
+  // For a failure outside the language, such as a stylesheet that does not compile.
+  [[nodiscard]] static Ref<NSError> errorWithDomain(std::string_view domain, int64_t code,
+                                                    std::string_view message);
+
   const Ref<NSString>& domain() const { return _domain; }
   int64_t code() const { return _code; }
   // Null when the error has neither message nor line.
   const UserInfo* userInfo() const { return _userInfo ? &*_userInfo : nullptr; }
-  // A new string for a reader.
+  // A new string for a reader: "domain:code", and the message when there is one.
   virtual Ref<NSString> localizedDescription() const;
   virtual Ref<NSString> description() const { return localizedDescription(); }
 
  protected:
   NSError(Kind kind, Ref<NSString> domain, int64_t code, std::optional<UserInfo> userInfo);
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
 
  private:
   Ref<NSString> _domain;

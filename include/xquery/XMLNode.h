@@ -28,6 +28,7 @@
 
 #include <cstdint>
 #include <functional>
+#include <map>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -35,9 +36,13 @@
 
 namespace xquery {
 
+class NSArray;
+class NSError;
+class NSURL;
 class NSXMLTree;
 class NSXMLElement;
 class NSXMLDocument;
+struct XQueryLoading;
 
 using NSXMLNodeKind = Kind;
 
@@ -180,6 +185,23 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
   // Writes through `write` in pieces of bounded size; stops when it answers false.
   void writeXML(const std::function<bool(std::string_view)>& write) const;
 
+  // --- queries ----------------------------------------------------------------------------------
+  // The items of the query's result with this node as context item, each call with a new context
+  // whose settings are the default ones; a host that needs others evaluates an XQuery. Null on
+  // failure, with `*error` (an XQueryError), when `error` is not null, set to what went wrong and
+  // to null otherwise.
+  [[nodiscard]] Ref<NSArray> objectsForXQuery(const Ref<NSString>& query,
+                                              Ref<NSError>* error = nullptr);
+  // The same for a query whose result must consist of nodes; an item that is none is error 19
+  // "item not a node".
+  [[nodiscard]] Ref<NSArray> nodesForXPath(const Ref<NSString>& path,
+                                           Ref<NSError>* error = nullptr);
+  // The path that leads from the root to this node alone: "/site[1]/people[1]/person[3]/@id", with
+  // "text()", "comment()" and "processing-instruction()" for nodes without a name and
+  // "namespace::p" for a namespace; "/" for a document. Names are as written. Linear in the number
+  // of ancestors and of the siblings before them.
+  Ref<NSString> XPath() const;
+
   // --- factories: each makes a parentless node in a tree of its own ------------------------------
   [[nodiscard]] static Ref<NSXMLNode> textWithStringValue(NSStringView text);
   [[nodiscard]] static Ref<NSXMLNode> cdataWithStringValue(NSStringView text);
@@ -310,6 +332,35 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
                                                            NSXMLParseError* error = nullptr);
 
   NSXMLElement* rootElement() const;  // the first element child
+
+  // --- stylesheets ------------------------------------------------------------------------------
+  // What an XSLT 1.0 stylesheet makes of this document, which is not changed: a string when its
+  // output method is text, else a new document. Arguments are values of stylesheet parameters by
+  // name, each an XPath expression ("3", "'text'").
+  //
+  // Null when the stylesheet does not compile, ends with a failure or a message that terminates,
+  // recurses more than some 3,000 templates deep, or when a document nests too deeply for it
+  // (10,000 levels; a stylesheet 3,000); `*error`, when `error` is not null, then says why and is
+  // null otherwise. What a stylesheet includes, imports or reads with document() is loaded as
+  // `loading` allows, at most 1,000 resources, and is empty otherwise; a stylesheet writes nothing
+  // and runs no code of others. Relative references of a stylesheet string have no base.
+  using XSLTArguments = std::map<std::string, std::string>;
+  [[nodiscard]] Value objectByApplyingXSLTString(const Ref<NSString>& stylesheet,
+                                                 const XSLTArguments& arguments,
+                                                 Ref<NSError>* error = nullptr) const;
+  [[nodiscard]] Value objectByApplyingXSLTString(const Ref<NSString>& stylesheet,
+                                                 const XSLTArguments& arguments,
+                                                 const XQueryLoading& loading,
+                                                 Ref<NSError>* error = nullptr) const;
+  // The stylesheet itself is loaded in the same way.
+  [[nodiscard]] Value objectByApplyingXSLTAtURL(const Ref<NSURL>& URL,
+                                                const XSLTArguments& arguments,
+                                                Ref<NSError>* error = nullptr) const;
+  [[nodiscard]] Value objectByApplyingXSLTAtURL(const Ref<NSURL>& URL,
+                                                const XSLTArguments& arguments,
+                                                const XQueryLoading& loading,
+                                                Ref<NSError>* error = nullptr) const;
+
   // The document's own URI; null when none was set.
   Ref<NSString> documentURI() const;
   void setURI(const Ref<NSString>& URI);

@@ -119,12 +119,11 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   // keeps its whole tree alive. When constructors recorded a base URI and the first item is an
   // element or a document, that element is given an xml:base attribute unless it has one.
   //
-  // Null on error and when there is no value at all (an empty query, a library module, "." without
-  // a context item). `*error`, when `error` is not null, is set to null first and on failure to the
-  // error: the first one of a query that failed to compile, 16 "unresloved external variable -
-  // name" or "unresloved external function - name", 0 and a text that begins with "limit: " when a
-  // limit of the context was reached or the engine ran out of stack, memory or digits, or what an
-  // expression raised.
+  // Null on error and when there is no value at all (an empty query, a library module). `*error`,
+  // when `error` is not null, is set to null first and on failure to the error: the first one of a
+  // query that failed to compile, 16 "unresloved external variable - name" or "unresloved external
+  // function - name", 0 and a text that begins with "limit: " when a limit of the context was
+  // reached or the engine ran out of stack, memory or digits, or what an expression raised.
   //
   // A null or NSNull context item leaves the context item of an earlier evaluation in force.
   [[nodiscard]] Ref<NSArray> evaluateXQuery(const XQuery& query, const XQueryConstants& constants,

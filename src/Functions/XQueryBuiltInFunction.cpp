@@ -1,6 +1,7 @@
 #include "Functions/XQueryBuiltInFunction.h"
 
 #include "Functions/FunctionsAggregate.h"
+#include "Functions/FunctionsBinary.h"
 #include "Functions/FunctionsBoolean.h"
 #include "Functions/FunctionsCodepoints.h"
 #include "Functions/FunctionsConstructors.h"
@@ -9,7 +10,9 @@
 #include "Functions/FunctionsDeepEqual.h"
 #include "Functions/FunctionsDuration.h"
 #include "Functions/FunctionsError.h"
+#include "Functions/FunctionsExtension.h"
 #include "Functions/FunctionsNode.h"
+#include "Functions/FunctionsNodeText.h"
 #include "Functions/FunctionsNumeric.h"
 #include "Functions/FunctionsQName.h"
 #include "Functions/FunctionsRegEx.h"
@@ -18,6 +21,7 @@
 #include "Functions/FunctionsStringMapping.h"
 #include "Functions/FunctionsSubstring.h"
 #include "Functions/FunctionsURI.h"
+#include "Functions/FunctionsXSLT.h"
 
 #include <algorithm>
 #include <array>
@@ -188,26 +192,26 @@ constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
     {XDT, "yearMonthDuration", xdt_yearMonthDuration},
     {XDT, "dayTimeDuration", xdt_dayTimeDuration},
     {XDT, "untypedAtomic", xdt_untypedAtomic},
-    {EXT, "_test", nullptr},
-    {EXT, "eval", nullptr},
-    {EXT, "string-from-node", nullptr},
-    {EXT, "node-from-string", nullptr},
-    {EXT, "binary-from-string", nullptr},
-    {EXT, "string-from-binary", nullptr},
-    {EXT, "binary-hex-to-base64", nullptr},
-    {EXT, "binary-base64-to-hex", nullptr},
-    {EXT, "binary-length", nullptr},
-    {EXT, "binary-insert", nullptr},
-    {EXT, "binary-remove", nullptr},
-    {EXT, "binary-find", nullptr},
-    {EXT, "binary-find-all", nullptr},
-    {EXT, "real-date-time", nullptr},
-    {EXT, "uri-body", nullptr},
-    {EXT, "xslt", nullptr},
-    {EXT, "xslt-uri", nullptr},
-    {EXT, "node-xquery", nullptr},
-    {EXT, "node-xpath", nullptr},
-    {EXT, "xpath-for-node", nullptr},
+    {EXT, "_test", ext_test},
+    {EXT, "eval", ext_eval},
+    {EXT, "string-from-node", ext_string_from_node},
+    {EXT, "node-from-string", ext_node_from_string},
+    {EXT, "binary-from-string", ext_binary_from_string},
+    {EXT, "string-from-binary", ext_string_from_binary},
+    {EXT, "binary-hex-to-base64", ext_binary_hex_to_base64},
+    {EXT, "binary-base64-to-hex", ext_binary_base64_to_hex},
+    {EXT, "binary-length", ext_binary_length},
+    {EXT, "binary-insert", ext_binary_insert},
+    {EXT, "binary-remove", ext_binary_remove},
+    {EXT, "binary-find", ext_binary_find},
+    {EXT, "binary-find-all", ext_binary_find_all},
+    {EXT, "real-date-time", ext_real_date_time},
+    {EXT, "uri-body", ext_uri_body},
+    {EXT, "xslt", ext_xslt},
+    {EXT, "xslt-uri", ext_xslt_uri},
+    {EXT, "node-xquery", ext_node_xquery},
+    {EXT, "node-xpath", ext_node_xpath},
+    {EXT, "xpath-for-node", ext_xpath_for_node},
 });
 
 // The functions of the standard namespace that read their arguments only. The constructors of the

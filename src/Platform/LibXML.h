@@ -1,4 +1,5 @@
-// libxml2, as the source of a document's events. Nothing else of the library includes its headers.
+// libxml2, as the source of a document's events. Its headers are included here, in LibXMLTree.cpp
+// and in LibXSLT.cpp only.
 //
 // Well-formedness, namespaces, encodings and internal entities are its work. External entities and
 // external DTDs are never read: a reference to one is an error. Depth and the length of texts are

@@ -29,10 +29,21 @@ std::optional<NSError::UserInfo> userInfoFor(const Ref<NSString>& msg, int64_t l
 NSError::NSError(Kind kind, Ref<NSString> domain, int64_t code, std::optional<UserInfo> userInfo)
     : NSCounted(kind), _domain(std::move(domain)), _code(code), _userInfo(std::move(userInfo)) {}
 
+Ref<NSError> NSError::errorWithDomain(std::string_view domain, int64_t code,
+                                      std::string_view message) {
+  UserInfo info{NSString::stringWithUTF8Replacing(message), std::nullopt};
+  return make<NSError>(Kind::Error, NSString::stringWithUTF8Replacing(domain), code,
+                       std::optional<UserInfo>(std::move(info)));
+}
+
 Ref<NSString> NSError::localizedDescription() const {
   NSMutableString text;
   text.append(_domain->view());
   text.appendASCII(":" + std::to_string(_code));
+  if (_userInfo && _userInfo->errorMessage) {
+    text.appendASCII(" - ");
+    text.append(_userInfo->errorMessage->view());
+  }
   return text.string();
 }
 

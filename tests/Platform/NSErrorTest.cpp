@@ -69,6 +69,16 @@ TEST(Error, NewErrorsAreLoggedOnlyWhenDiagnosticsAreOn) {
   ::unsetenv("XQUERY_LOG");
 }
 
+TEST(Error, OfAnotherDomainNamesItWithCodeAndMessage) {
+  const Ref<NSError> error = NSError::errorWithDomain("XSLT", 1, "cannot load \xC3\xA9");
+  EXPECT_EQ(error->domain()->utf8(), "XSLT");
+  EXPECT_EQ(error->code(), 1);
+  EXPECT_EQ(error->userInfo()->errorMessage->utf8(), "cannot load \xC3\xA9");
+  EXPECT_FALSE(error->userInfo()->errorLine);
+  EXPECT_EQ(error->description()->utf8(), "XSLT:1 - cannot load \xC3\xA9");
+  EXPECT_FALSE(isa<XQueryError>(static_cast<NSObject*>(error.get())));
+}
+
 TEST(Error, ExceptionKeepsNameAndReason) {
   const NSException exception("XQueryError", NSString::stringWithASCII("why"));
   EXPECT_EQ(exception.name(), "XQueryError");

@@ -1,0 +1,44 @@
+#include "Functions/FunctionsXSLT.h"
+
+#include "Eval/XQueryContextInternal.h"
+#include "Functions/FunctionsURI.h"
+#include "Platform/XMLStylesheet.h"
+#include "Types/XQueryTypeTable.h"
+
+namespace xquery {
+namespace {
+
+// Null for other arguments than a document and something else.
+const NSXMLDocument* documentOf(const Value* arguments, size_t count) {
+  return count == 2 ? dyn_cast<NSXMLDocument>(arguments[0].get()) : nullptr;
+}
+
+}  // namespace
+
+// Why a stylesheet gives no result is not told by either.
+
+Value ext_xslt(const Value* arguments, size_t count, XQueryContext& context) {
+  const NSXMLDocument* document = documentOf(arguments, count);
+  if (!document) return Value();
+  const Value stylesheet = XQueryPromoteToString(arguments[1], context);
+  const Ref<NSString> base = context._internal().baseURI();
+  // The host may set other settings while its loader is called.
+  const Ref<NSURLLoader> loader = &context._internal().loader();
+  std::string ignored;
+  return XMLResultOfStylesheet(*document, *cast<NSString>(stylesheet.get()),
+                               base ? base->utf8() : "", {}, *loader, ignored);
+}
+
+Value ext_xslt_uri(const Value* arguments, size_t count, XQueryContext& context) {
+  const NSXMLDocument* document = documentOf(arguments, count);
+  if (!document) return Value();
+  const Ref<NSString> reference = cast<NSString>(XQueryPromoteToString(arguments[1], context));
+  if (reference->length() == 0) return Value();
+  const Ref<NSURL> URL = XQueryURLInContext(reference, context);
+  if (!URL) return Value();
+  const Ref<NSURLLoader> loader = &context._internal().loader();
+  std::string ignored;
+  return XMLResultOfStylesheetAtURL(*document, *URL, {}, *loader, ignored);
+}
+
+}  // namespace xquery
