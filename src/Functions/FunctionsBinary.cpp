@@ -1,5 +1,6 @@
 #include "Functions/FunctionsBinary.h"
 
+#include "Eval/XQueryContextInternal.h"
 #include "Platform/TextEncoding.h"
 #include "Platform/WorkMeter.h"
 #include "Types/XQueryBinary.h"
@@ -7,12 +8,20 @@
 #include "Types/XQueryDataMatch.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
+#include "xquery/Error.h"
 
 namespace xquery {
 namespace {
 
+// Of a URI the cast answers the error that it raises of everything else.
+Value binaryOfType(XQueryTypeID type, const Value& value, XQueryContext& context) {
+  Value binary = XQueryCastAsTypeForContext(value, type, context);
+  if (auto* error = dyn_cast<XQueryError>(binary.get())) context._internal().raise(error);
+  return binary;
+}
+
 Ref<NSData> hexBinaryData(const Value& value, XQueryContext& context) {
-  const Value binary = XQueryCastAsTypeForContext(value, XQueryTypeHexBinary, context);
+  const Value binary = binaryOfType(XQueryTypeHexBinary, value, context);
   return cast<XQueryHexBinary>(binary.get())->data();
 }
 
@@ -25,8 +34,7 @@ std::string charsetOf(const Value* arguments, size_t count, XQueryContext& conte
 Value converted(const Value* arguments, size_t count, XQueryTypeID from, XQueryTypeID to,
                 XQueryContext& context) {
   if (count != 1) return Value();
-  const Value binary = XQueryCastAsTypeForContext(arguments[0], from, context);
-  return XQueryCastAsTypeForContext(binary, to, context);
+  return XQueryCastAsTypeForContext(binaryOfType(from, arguments[0], context), to, context);
 }
 
 // What lies between two patterns, themselves included: the bytes of the first match, or of each.

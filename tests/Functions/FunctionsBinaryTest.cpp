@@ -2,6 +2,7 @@
 #include "Functions/FunctionsTesting.h"
 #include "Types/XQueryBinary.h"
 #include "xquery/Data.h"
+#include "xquery/URL.h"
 
 namespace xquery {
 namespace {
@@ -207,6 +208,22 @@ TEST(BinaryFunctions, CheckTheirArgumentCounts) {
     const std::vector<Value> arguments(count, hex("00"));
     EXPECT_EQ(call(ext_binary_find, arguments), "null");
     EXPECT_EQ(call(ext_binary_find_all, arguments), "null");
+  }
+}
+
+// A cast from a URI answers its error where other casts raise it.
+TEST(BinaryFunctions, AURIIsNoBinary) {
+  const Value URI = NSURL::URLWithString(NSString::stringWithASCII("urn:x"));
+  const Value binary = hex("00");
+  const std::string failure(operatortest::invalidCast);
+  for (const auto procedure : {ext_string_from_binary, ext_binary_hex_to_base64,
+                               ext_binary_base64_to_hex, ext_binary_length}) {
+    EXPECT_EQ(call(procedure, {URI}), failure);
+  }
+  for (const auto procedure : {ext_binary_find, ext_binary_find_all}) {
+    EXPECT_EQ(call(procedure, {URI, binary, binary}), failure);
+    EXPECT_EQ(call(procedure, {binary, URI, binary}), failure);
+    EXPECT_EQ(call(procedure, {binary, binary, URI}), failure);
   }
 }
 
