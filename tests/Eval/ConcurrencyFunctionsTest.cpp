@@ -60,6 +60,20 @@ constexpr Work works[] = {
     {"JoinedPaths",
      "for $a in //book return count(//book[price = $a/price]), "
      "for $i in 1 to 20 return //book[@id = concat('b', $i)]/title"},
+    {"InnerQueries",
+     "for $i in 1 to 5 return (ext:eval('sum(//price)', /), ext:node-xquery(/library, "
+     "'count(book)'), "
+     "ext:node-xpath(/library, 'book[2]/title'), ext:xpath-for-node((//b)[3]), "
+     "ext:node-from-string(ext:string-from-node(//book[$i])))"},
+    {"Stylesheets",
+     "for $i in 1 to 3 return ext:xslt(/, '<x:stylesheet version=\"1.0\" "
+     "xmlns:x=\"http://www.w3.org/1999/XSL/Transform\"><x:template match=\"/\"><all>"
+     "<x:for-each select=\"//book\"><x:sort select=\"price\"/><b><x:value-of "
+     "select=\"title\"/></b></x:for-each></all></x:template></x:stylesheet>')/*"},
+    {"FailingStylesheets",
+     "(1 to 3)[ext:xslt(/, '<x:stylesheet version=\"1.0\" "
+     "xmlns:x=\"http://www.w3.org/1999/XSL/Transform\"><x:template match=\"/\"><x:message "
+     "terminate=\"yes\">no</x:message></x:template></x:stylesheet>')], 'after'"},
     {"Binaries",
      "for $i in 1 to 20 return (xs:hexBinary('0aFF'), xs:base64Binary('AQID') cast as "
      "xs:hexBinary, xs:hexBinary('00') eq xs:hexBinary('00'))"},
