@@ -79,4 +79,8 @@ const std::vector<Function>& resourceFunctions() {
   return functions;
 }
 
+TEST(ResourceArguments, EndAsTheRulesSay) {
+  expectRules(resourceFunctions());
+}
+
 }  // namespace xquery::arguments
