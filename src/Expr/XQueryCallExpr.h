@@ -17,6 +17,8 @@ class XQueryCallExpr : public XQueryExpr {
   // Whether the function answers equal values for the same arguments, fails alike, looks at nothing
   // else and does nothing else. Found by binding.
   bool readsArgumentsOnly() const { return _readsArgumentsOnly; }
+  // Whether a call asks the host for a document, which the host can tell. Found by binding.
+  bool loadsDocuments() const { return _loadsDocuments; }
 
  protected:
   explicit XQueryCallExpr(Ref<XQueryArgs> args)
@@ -24,6 +26,7 @@ class XQueryCallExpr : public XQueryExpr {
 
   Ref<XQueryArgs> _args;
   bool _readsArgumentsOnly = false;
+  bool _loadsDocuments = false;
 };
 
 }  // namespace xquery

@@ -134,7 +134,6 @@ void XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toRe
 
 void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
                                   XQueryFLWORResults& toResults, XQueryContext& withContext) const {
-  auto& dynamic = withContext._internal();
   const bool isLast = index + 1 == _forLet.size();
   if (isLast && _join && evaluateJoin(clause, toResults, withContext)) return;
   const XQueryClauseItems items(clause.expr(), true, withContext);
@@ -142,11 +141,7 @@ void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
     checkWork();
     Value item = items[k];
     checkType(clause, item.get(), withContext);
-    dynamic.setVariable(std::move(item), clause.varID());
-    if (clause.posVarID()) {
-      dynamic.setVariable(NSNumber::numberWithLongLong(static_cast<int64_t>(k) + 1),
-                          clause.posVarID());
-    }
+    setTuple(clause, std::move(item), k, withContext);
     if (isLast) {
       processItem(toResults, withContext);
     } else {
@@ -155,26 +150,34 @@ void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
   }
 }
 
+// `position` counts from 0.
+void XQueryFLWORExpr::setTuple(const XQueryForExpr& clause, Value item, size_t position,
+                               XQueryContext& context) {
+  auto& dynamic = context._internal();
+  dynamic.setVariable(std::move(item), clause.varID());
+  if (!clause.posVarID()) return;
+  dynamic.setVariable(NSNumber::numberWithLongLong(static_cast<int64_t>(position) + 1),
+                      clause.posVarID());
+}
+
 // The tuples that the table of the join leaves over; false when it has nothing to say.
 bool XQueryFLWORExpr::evaluateJoin(const XQueryForExpr& clause, XQueryFLWORResults& toResults,
                                    XQueryContext& withContext) const {
-  auto& dynamic = withContext._internal();
   XQueryJoinTable::Selection selection;
   const auto table = _join->select(*this, withContext, selection);
   if (!table) return false;
+  const auto& items = table->items();
   for (const auto& match : selection) {
     checkWork();
-    dynamic.setVariable(table->items()[match.position], clause.varID());
-    if (clause.posVarID()) {
-      dynamic.setVariable(NSNumber::numberWithLongLong(int64_t{match.position} + 1),
-                          clause.posVarID());
-    }
+    setTuple(clause, items[match.position], match.position, withContext);
     if (_join->decides(match)) {
       addTuple(toResults, withContext);
     } else {
       processItem(toResults, withContext);
     }
   }
+  // Where the ID is used again by a variable that is never set, the last item can be read.
+  setTuple(clause, items.back(), items.size() - 1, withContext);
   return true;
 }
 

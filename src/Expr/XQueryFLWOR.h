@@ -113,6 +113,8 @@ class XQueryFLWORExpr : public XQueryExpr {
                           XQueryContext& withContext) const;
   void evaluateFor(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
                    XQueryContext& withContext) const;
+  static void setTuple(const XQueryForExpr& clause, Value item, size_t position,
+                       XQueryContext& context);
   bool evaluateJoin(const XQueryForExpr& clause, XQueryFLWORResults& toResults,
                     XQueryContext& withContext) const;
   void processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const;

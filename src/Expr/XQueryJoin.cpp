@@ -10,6 +10,7 @@
 #include "Types/XQueryAtomization.h"
 #include "xquery/Number.h"
 
+#include <algorithm>
 #include <array>
 #include <utility>
 
@@ -36,6 +37,34 @@ Value valueOrNull(const XQueryExpr& expr, XQueryContext& context) {
     dynamic.setLast(last);
     return {};
   }
+}
+
+// Whether all nodes of the value belong to documents. They stay where they are, while a constructor
+// gives a parent to a node that has none.
+bool isInDocuments(const NSObject* value) {
+  constexpr size_t mostItems = 64;
+  const XQueryItemList list(value);
+  if (list.count() > mostItems) return false;
+  for (size_t i = 0; i < list.count(); ++i) {
+    const auto* node = dyn_cast<NSXMLNode>(list[i]);
+    if (node && !node->rootDocument()) return false;
+  }
+  return true;
+}
+
+// Whether what probe and guards find outside their nodes is the same for the whole round, whatever
+// is constructed meanwhile.
+bool staysInRound(const XQueryJoinCondition& condition, XQueryContext& context) {
+  const auto& dynamic = context._internal();
+  return std::all_of(
+      condition.outward.begin(), condition.outward.end(), [&](const XQueryReads& reads) {
+        if (reads.globals || (reads.focus && !isInDocuments(dynamic.contextItem().get()))) {
+          return false;
+        }
+        return std::all_of(reads.variables.begin(), reads.variables.end(), [&](int64_t varID) {
+          return isInDocuments(dynamic.variableForID(varID));
+        });
+      });
 }
 
 enum class Answer : uint8_t { No, Yes, Failure };
@@ -70,7 +99,7 @@ std::shared_ptr<XQueryJoinTable> selectFromMemo(const XQueryExpr& owner,
     case XQueryJoinMemo::Use::Further:
       break;
   }
-  if (!table) return nullptr;
+  if (!table || !staysInRound(condition, context)) return nullptr;
   const Answer guards = answerOf(condition.guards, context);
   if (guards == Answer::Failure) return nullptr;
   // Without a probe nothing is met, but what may be an error has still to be asked.
@@ -174,6 +203,8 @@ std::unique_ptr<const XQueryPathJoin> XQueryPathJoin::joinOf(const XQueryStep* f
     if (!condition.key) continue;
     if (axisStep) {
       if (step->next() && !isa<XQueryAxisStep>(step->next())) return nullptr;
+      // All of the nodes are filtered before the next step sees one, and as if by their own.
+      if (!XQueryIsRepeatable(*step->predicates().front())) return nullptr;
       const XQueryReads reads = XQueryReadsOfSteps(*firstAxisStep, *step);
       const bool isSettled = reads.isRepeatable && !reads.outside && reads.variables.empty();
       if (!isSettled) return nullptr;

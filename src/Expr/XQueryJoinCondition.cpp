@@ -58,6 +58,8 @@ XQueryJoinCondition comparisonIn(const XQueryExpr& condition,
   const auto* comparison = dyn_cast<XQueryOperatorExpr>(&condition);
   const auto code = comparison ? relationCode(comparison->operatorType()) : std::nullopt;
   if (!code || !comparison->left() || !comparison->right()) return found;
+  // A comparison with a range looks at its bounds; listing its integers may take all memory.
+  if (XQueryOperatorExpr::rangeIn(comparison->right())) return found;
   found.relation = XQueryRelationForCode(*code);
   found.isValueComparison = comparison->operatorType() >= XQueryOperatorEq;
   const XQueryExpr* left = comparison->left();
@@ -110,6 +112,12 @@ XQueryJoinCondition XQueryJoinCondition::in(const XQueryExpr* condition, bool er
   std::vector<const XQueryExpr*> filters;
   std::vector<const XQueryExpr*> guards;
   for (const XQueryExpr* conjunct : all) {
+    if (!conjunct) break;
+    const XQueryReads parts = XQueryReadsOf(*conjunct);
+    if (!parts.isRepeatable) break;
+    // The plain way, which came first, has fetched what the first condition asks for of each item,
+    // and may not have come to the others.
+    if (parts.loads && conjunct != all.front()) break;
     XQueryJoinCondition found = comparisonIn(*conjunct, reads);
     if (promiseOf(found) > promiseOf(best)) {
       best = std::move(found);
@@ -117,12 +125,21 @@ XQueryJoinCondition XQueryJoinCondition::in(const XQueryExpr* condition, bool er
       best.filters = filters;
       best.guards = guards;
     }
+    if (errorExcludes && parts.loads) break;
     if (errorExcludes) continue;
     const XQueryJoinReads read = reads(*conjunct);
     if (read == XQueryJoinReads::Unknown) break;
     (read == XQueryJoinReads::Item ? filters : guards).push_back(conjunct);
   }
+  if (!best.key) return best;
+  best.addOutward(*best.probe);
+  for (const XQueryExpr* guard : best.guards) best.addOutward(*guard);
   return best;
+}
+
+void XQueryJoinCondition::addOutward(const XQueryExpr& expr) {
+  XQueryReads reads = XQueryReadsOf(expr);
+  if (reads.outside) outward.push_back(std::move(reads));
 }
 
 }  // namespace xquery

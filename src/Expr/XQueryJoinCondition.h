@@ -30,13 +30,18 @@ struct XQueryJoinCondition {
   // those that do not read it.
   std::vector<const XQueryExpr*> filters;
   std::vector<const XQueryExpr*> guards;
+  // What those of the probe and the guards read that look outside the nodes they start from.
+  std::vector<XQueryReads> outward;
 
   using Reads = std::function<XQueryJoinReads(const XQueryExpr&)>;
   // Of several comparisons joined by "and" the one that promises to exclude most. An item that it
   // excludes is excluded by the whole condition: where an error excludes as well (`errorExcludes`)
-  // whatever the others are, and otherwise because only filters and guards stand before it.
+  // because what stands before it is repeatable, and otherwise because only filters and guards do.
   static XQueryJoinCondition in(const XQueryExpr* condition, bool errorExcludes,
                                 const Reads& reads);
+
+ private:
+  void addOutward(const XQueryExpr& expr);
 };
 
 }  // namespace xquery

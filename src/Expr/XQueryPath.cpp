@@ -453,6 +453,7 @@ bool XQueryPathExpr::joinItems(Value& items, XQueryContext& context) const {
   const auto table = _join->select(*this, items, listItems, context, selection);
   if (!table) return false;
   const XQueryExpr& predicate = *_join->step()->predicates().front();
+  context._internal().setLast(static_cast<int64_t>(table->items().size()));
   XQueryGatherer kept;
   for (const auto& match : selection) {
     const Value& item = table->items()[match.position];

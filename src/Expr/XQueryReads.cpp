@@ -108,6 +108,7 @@ class Reader {
         return true;
       case Kind::FunctionCall:
         add(cast<XQueryCallExpr>(part.expr)->args(), outer);
+        _reads.loads = _reads.loads || cast<XQueryCallExpr>(part.expr)->loadsDocuments();
         return cast<XQueryCallExpr>(part.expr)->readsArgumentsOnly();
       case Kind::PathExpr:
         addSteps(cast<XQueryPathExpr>(part.expr)->step(), nullptr, outer);

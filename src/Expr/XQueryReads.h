@@ -23,6 +23,8 @@ struct XQueryReads {
   // made gets a parent later, so this may change, while what is inside a node never does.
   bool outside = false;
   bool globals = false;
+  // A document may be fetched, once for the whole evaluation.
+  bool loads = false;
   // IDs of local variables, each once.
   std::vector<int64_t> variables;
 

@@ -215,7 +215,8 @@ constexpr auto table = std::to_array<XQueryBuiltInFunction::Registration>({
 });
 
 // The functions of the standard namespace that read their arguments only. The constructors of the
-// type namespaces all do. A document is fetched once per context, so doc is one of them.
+// type namespaces all do, apart from those of names, which look for prefixes in what is around
+// them. A document is fetched once per context, so doc is one of them.
 constexpr auto readers = std::to_array<std::string_view>({
     "abs",
     "boolean",
@@ -254,7 +255,9 @@ constexpr auto readers = std::to_array<std::string_view>({
 });
 
 bool readsArgumentsOnly(const XQueryBuiltInFunction::Registration& row) {
-  if (row.namespaceID == XS || row.namespaceID == XDT) return true;
+  if (row.namespaceID == XS || row.namespaceID == XDT) {
+    return row.proc != xs_QName && row.proc != xs_NOTATION;
+  }
   return row.namespaceID == FN &&
          std::find(readers.begin(), readers.end(), row.localName) != readers.end();
 }
@@ -290,6 +293,10 @@ const XQueryBuiltInFunction* XQueryBuiltInFunction::entryForQName(const Ref<XQue
   static const Registry* const registry = makeRegistry();
   const auto found = registry->find(qName);
   return found == registry->end() ? nullptr : found->second.get();
+}
+
+bool XQueryBuiltInFunction::loadsDocuments() const {
+  return _proc == fn_doc;
 }
 
 XQueryProcedure XQueryBuiltInFunction::functionForQName(const Ref<XQueryQName>& qName) {

@@ -32,6 +32,8 @@ class XQueryBuiltInFunction : public NSCounted {
   // else and does nothing else. Holds for calls with at least one argument: without any, some of
   // these functions take the context item.
   bool readsArgumentsOnly() const { return _readsArgumentsOnly; }
+  // Whether a call asks the host for a document, which the host can tell.
+  bool loadsDocuments() const;
 
   // Null for a name that is not registered.
   static XQueryProcedure functionForQName(const Ref<XQueryQName>& qName);

@@ -65,6 +65,7 @@ void XQueryFunctionCall::bindInfoForProlog(XQueryProlog& prolog) {
     if (const auto* entry = XQueryBuiltInFunction::entryForQName(qName)) {
       _function = entry->proc();
       _readsArgumentsOnly = entry->readsArgumentsOnly() && argumentCount() > 0;
+      _loadsDocuments = entry->loadsDocuments();
     }
     if (!_function) _functionDecl = prolog.functionInfoForSignature({qName, argumentCount()});
   }
