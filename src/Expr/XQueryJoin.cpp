@@ -79,6 +79,10 @@ Answer answerOf(const std::vector<const XQueryExpr*>& conditions, XQueryContext&
   return Answer::Yes;
 }
 
+bool looksAway(const XQueryExpr& owner, XQueryContext& context) {
+  return XQueryLogEnabled() || context._internal().joinMemo().looksAway(owner);
+}
+
 // Asks the memo, makes the table when it is worth it, and asks the table.
 template <class MakeTable>
 std::shared_ptr<XQueryJoinTable> selectFromMemo(const XQueryExpr& owner,
@@ -87,7 +91,6 @@ std::shared_ptr<XQueryJoinTable> selectFromMemo(const XQueryExpr& owner,
                                                 XQueryContext& context,
                                                 XQueryJoinTable::Selection& selection,
                                                 MakeTable makeTable) {
-  if (XQueryLogEnabled()) return nullptr;
   std::shared_ptr<XQueryJoinTable> table;
   switch (context._internal().joinMemo().use(owner, dependencies, table)) {
     case XQueryJoinMemo::Use::First:
@@ -141,6 +144,7 @@ std::unique_ptr<const XQueryForJoin> XQueryForJoin::joinOf(const XQueryForExpr& 
 
 std::shared_ptr<XQueryJoinTable> XQueryForJoin::select(
     const XQueryExpr& owner, XQueryContext& context, XQueryJoinTable::Selection& selection) const {
+  if (looksAway(owner, context)) return nullptr;
   const auto& dynamic = context._internal();
   std::array<Value, mostVariables + 2> dependencies;
   size_t count = 0;
@@ -217,6 +221,7 @@ std::unique_ptr<const XQueryPathJoin> XQueryPathJoin::joinOf(const XQueryStep* f
 std::shared_ptr<XQueryJoinTable> XQueryPathJoin::select(
     const XQueryExpr& owner, const Value& start, const ItemLister& listItems,
     XQueryContext& context, XQueryJoinTable::Selection& selection) const {
+  if (looksAway(owner, context)) return nullptr;
   const auto makeTable = [&]() -> std::shared_ptr<XQueryJoinTable> {
     std::vector<Value> items;
     if (!listItems(items) || !isWorthATable(items)) return nullptr;

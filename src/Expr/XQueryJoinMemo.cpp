@@ -4,6 +4,19 @@
 
 namespace xquery {
 
+// After a few first uses in a row all but two, one after the other, of every so many uses.
+bool XQueryJoinMemo::looksAway(const XQueryExpr& expr) {
+  constexpr uint32_t patience = 16;
+  constexpr uint32_t period = 32;
+  const auto found = _entries.find(&expr);
+  if (found == _entries.end() || found->second.firsts < patience) return false;
+  Entry& entry = found->second;
+  ++entry.firsts;
+  if (entry.firsts < patience + period) return true;
+  entry.firsts = patience - 2;
+  return false;
+}
+
 XQueryJoinMemo::Use XQueryJoinMemo::use(const XQueryExpr& expr, std::span<const Value> dependencies,
                                         std::shared_ptr<XQueryJoinTable>& table) {
   const auto [found, isNew] = _entries.try_emplace(&expr);
@@ -13,8 +26,10 @@ XQueryJoinMemo::Use XQueryJoinMemo::use(const XQueryExpr& expr, std::span<const 
     known.assign(dependencies.begin(), dependencies.end());
     entry.isDecided = false;
     entry.table = nullptr;
+    ++entry.firsts;
     return Use::First;
   }
+  entry.firsts = 0;
   table = entry.table;
   return entry.isDecided ? Use::Further : Use::Second;
 }

@@ -2,12 +2,15 @@
 //
 // An expression has one table at most, for what it depended on when the table was made. A table is
 // worth its making only when it is used again, so it is made when the expression is evaluated the
-// second time with the same things to depend on.
+// second time with the same things to depend on. Most expressions never are (the path in "for $p in
+// $people return $p/profile[@income > 5000]"), and looking costs more than a short path, so after
+// a few disappointments in a row the memo looks only now and then.
 #pragma once
 
 #include "Expr/XQueryJoinTable.h"
 #include "xquery/Object.h"
 
+#include <cstdint>
 #include <memory>
 #include <span>
 #include <unordered_map>
@@ -24,6 +27,8 @@ class XQueryJoinMemo {
     Second,   // make a table, or find that none can be made, and tell with `keep`
     Further,  // `table` is what was kept
   };
+  // To be asked before every use: whether to take the plain way without looking.
+  bool looksAway(const XQueryExpr& expr);
   // What is compared of the dependencies is their identity; the memo keeps them alive.
   Use use(const XQueryExpr& expr, std::span<const Value> dependencies,
           std::shared_ptr<XQueryJoinTable>& table);
@@ -35,6 +40,7 @@ class XQueryJoinMemo {
   struct Entry {
     std::vector<Value> dependencies;
     bool isDecided = false;
+    uint32_t firsts = 0;  // in a row
     std::shared_ptr<XQueryJoinTable> table;
   };
 
