@@ -20,6 +20,9 @@ namespace xquery {
 
 namespace {
 
+constexpr xmlChar noText[] = {0};
+
+// For the time that the text lives.
 const xmlChar* XMLText(const std::string& text) {
   return reinterpret_cast<const xmlChar*>(text.c_str());
 }
@@ -192,7 +195,7 @@ void Exporter::setValue(xmlAttr* attribute, NSStringView value) {
 xmlNode* Exporter::makeText(NSStringView text) {
   if (!text.isWide() && text.length() <= INT_MAX) {
     const auto* bytes = reinterpret_cast<const xmlChar*>(text.asciiUnits());
-    return required(xmlNewDocTextLen(_document.get(), text.isEmpty() ? XMLText("") : bytes,
+    return required(xmlNewDocTextLen(_document.get(), text.isEmpty() ? noText : bytes,
                                      static_cast<int>(text.length())));
   }
   const std::string bytes = text.utf8();
@@ -375,7 +378,7 @@ void Importer::openElement(const xmlNode* element) {
   WorkPacer pacer;
   for (const xmlNs* declared = element->nsDef; declared; declared = declared->next) {
     pacer.turn();
-    const xmlChar* prefix = declared->prefix ? declared->prefix : XMLText("");
+    const xmlChar* prefix = declared->prefix ? declared->prefix : noText;
     setText(_builder.addProperty(Kind::Namespace, name(prefix, nullptr)), viewOf(declared->href));
   }
   for (const xmlAttr* attribute = element->properties; attribute; attribute = attribute->next) {

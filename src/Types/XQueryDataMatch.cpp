@@ -1,5 +1,6 @@
 #include "Types/XQueryDataMatch.h"
 
+#include "Platform/WorkMeter.h"
 #include "xquery/Collection.h"
 
 #include <cstring>
@@ -8,6 +9,9 @@
 namespace xquery {
 
 namespace {
+
+// Of a search, which is as fast as memory is read.
+constexpr size_t bytesPerStep = 4096;
 
 using Range = std::optional<XQueryDataRange>;
 using Matcher = Range (*)(std::string_view data, std::string_view pattern, size_t from);
@@ -97,6 +101,7 @@ Value XQueryDataMatch(const NSData& data, const NSObject* start, const NSObject*
   size_t position = 0;
   while (const Range range = matchBetween(data.bytes(), starts, ends, position)) {
     if (range->length == 0 || range->end() <= position) break;
+    checkWork(1 + range->length / bytesPerStep);
     slices.push_back(sliceOf(data, *range));
     position = range->end();
   }

@@ -4,6 +4,8 @@
 #include "xquery/Data.h"
 #include "xquery/URL.h"
 
+#include <chrono>
+
 namespace xquery {
 namespace {
 
@@ -195,6 +197,20 @@ TEST(BinaryFind, IsLinearInTheData) {
   const std::string query =
       "declare variable $d external; count(ext:binary-find-all($d, '00', '00'))";
   EXPECT_EQ(answer(query, {}, {{"d", hex(std::string(2000000, '0'))}}), "integer 500000");
+}
+
+TEST(BinaryFind, EndsAtTheDeadline) {
+  const Ref<XQueryContext> context = XQueryContext::xqueryContext();
+  XQueryLimits limits;
+  limits.duration = std::chrono::milliseconds(20);
+  context->contextSetLimits(limits);
+  const Value data = hex(std::string(20000000, '0'));
+  Ref<XQueryError> error;
+  const auto query = XQuery::xqueryWithSource(
+      "declare variable $d external; count(ext:binary-find-all($d, '00', '00'))");
+  EXPECT_FALSE(context->evaluateXQuery(*query, {{"d", data}}, {}, &error));
+  ASSERT_TRUE(error);
+  EXPECT_EQ(error->msg()->utf8(), "limit: deadline passed");
 }
 
 TEST(BinaryFunctions, CheckTheirArgumentCounts) {
