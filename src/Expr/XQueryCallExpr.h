@@ -19,6 +19,8 @@ class XQueryCallExpr : public XQueryExpr {
   bool readsArgumentsOnly() const { return _readsArgumentsOnly; }
   // Whether a call asks the host for a document, which the host can tell. Found by binding.
   bool loadsDocuments() const { return _loadsDocuments; }
+  // Whether a call answers truth values and nothing else. Found by binding.
+  bool answersTruth() const { return _answersTruth; }
 
  protected:
   explicit XQueryCallExpr(Ref<XQueryArgs> args)
@@ -27,6 +29,7 @@ class XQueryCallExpr : public XQueryExpr {
   Ref<XQueryArgs> _args;
   bool _readsArgumentsOnly = false;
   bool _loadsDocuments = false;
+  bool _answersTruth = false;
 };
 
 }  // namespace xquery

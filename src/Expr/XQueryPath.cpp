@@ -7,16 +7,17 @@
 // this holds (findShortcuts); both are left out while an error may arise from the path's own items,
 // since it would leave the focus of the step it met.
 //
-// A step without predicates at the head of such a chain keeps a trail: it does not walk nodes again
-// that it has walked from an earlier context item (XQueryAxisTrail). Trails hold nodes of the
-// path's items only, which live as long as the evaluation: steps behind a filter step keep none.
+// A step at the head of such a chain whose predicates cannot tell keeps a trail: it does not walk
+// nodes again that it has walked from an earlier context item (XQueryAxisTrail). Trails hold nodes
+// of the path's items only, which live as long as the evaluation: steps behind a filter step keep
+// none.
 //
 // "//": a step descendant-or-self::node() and a child step after it visit, for a node whose
 // descendant axis ends with its subtree, exactly the node's descendants, each once, as the child of
 // its parent. The descendant axis visits the same nodes in document order without touching every
 // node twice. The order differs (the two steps go parent by parent), so the child step takes the
-// descendant axis of the node only when neither step has predicates, both are repeatable with all
-// steps after them, and the path's results will be sorted.
+// descendant axis of the node only when no predicate can tell, both are repeatable with all steps
+// after them, and the path's results will be sorted.
 #include "Expr/XQueryPath.h"
 
 #include "Eval/StackGuard.h"
@@ -147,17 +148,21 @@ bool XQueryAxisStep::isDescendantShorthand() const {
          test->acceptsCount(1);
 }
 
-bool XQueryAxisStep::takesPlainChildren() const {
-  return _axis == XQueryAxisChild && _predicates.empty();
+// Whether the step may walk the descendants of a node in place of the children of each of them.
+bool XQueryAxisStep::mayTakeDescendants() const {
+  return _axis == XQueryAxisChild && hasPredicatesOfTruth();
 }
 
-// Whether walks of a step without predicates from different nodes may meet the same node, apart
-// from those whose nodes go straight to the results, which hold each node once anyway.
+// Whether walks of a step from different nodes may meet the same node and nothing can tell whether
+// it is met again: predicates, apart from those that only ask for truth, see a list for each node
+// walked from. Not counted are steps whose nodes go straight to the results, which hold each node
+// once anyway.
 bool XQueryAxisStep::mayWalkTwice(const XQueryAxisStep* previous) const {
+  if (_axis == XQueryAxisChild) {  // walks descendants in place of a "//" before it
+    return previous && previous->isDescendantShorthand() && mayTakeDescendants();
+  }
   if (!_predicates.empty()) return false;
   switch (_axis) {
-    case XQueryAxisChild:  // walks descendants in place of a "//" before it
-      return previous && previous->isDescendantShorthand();
     case XQueryAxisAttribute:
     case XQueryAxisSelf:
       return false;
@@ -191,12 +196,18 @@ void XQueryAxisStep::processNodes(const std::vector<NSXMLNode*>& nodes, XQueryPa
 
 void XQueryAxisStep::processNode(NSXMLNode* node, XQueryPathRun& run) const {
   enter(node, run);
-  if (!_predicates.empty()) {
-    filter(node, run);
-  } else if (absorbsNextFor(node, run)) {
-    cast<XQueryAxisStep>(_next.get())->stream(XQueryAxisDescendant, node, run);
+  if (absorbsNextFor(node, run)) {
+    cast<XQueryAxisStep>(_next.get())->take(XQueryAxisDescendant, node, run);
   } else {
-    stream(_axis, node, run);
+    take(_axis, node, run);
+  }
+}
+
+void XQueryAxisStep::take(int axis, NSXMLNode* node, XQueryPathRun& run) const {
+  if (_predicates.empty()) {
+    stream(axis, node, run);
+  } else {
+    filter(axis, node, run);
   }
 }
 
@@ -246,9 +257,9 @@ void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& ru
 }
 
 // Gathers the nodes found from one context item, filters them and hands on what is left.
-void XQueryAxisStep::filter(NSXMLNode* node, XQueryPathRun& run) const {
+void XQueryAxisStep::filter(int axis, NSXMLNode* node, XQueryPathRun& run) const {
   std::vector<NSXMLNode*>& nodes = run.openNodeList();
-  const size_t predicatesDone = collect(node, nodes, run);
+  const size_t predicatesDone = collect(axis, node, nodes, run);
   if (run.listingStep == this) {
     run.listed->insert(run.listed->end(), nodes.begin(), nodes.end());
     return run.closeNodeList();
@@ -268,24 +279,29 @@ void XQueryAxisStep::filter(NSXMLNode* node, XQueryPathRun& run) const {
 
 // Gathers the step's nodes along the axis, nearest first for a reverse axis. Answers how many
 // predicates are dealt with: the walk stops at the node that a literal position asks for.
-size_t XQueryAxisStep::collect(NSXMLNode* node, std::vector<NSXMLNode*>& nodes,
+size_t XQueryAxisStep::collect(int axis, NSXMLNode* node, std::vector<NSXMLNode*>& nodes,
                                XQueryPathRun& run) const {
   XQueryNodeTest test(_expr.get(), run);
   const auto position = literalPosition(0);
   if (position && !testMayRaise()) {
     uint64_t left = *position;
     if (left == 0) return 1;
-    XQueryWalkAlongAxis(node, _axis, [&](NSXMLNode* found) {
+    XQueryWalkAlongAxis(node, axis, [&](NSXMLNode* found) {
       if (!test.matches(found) || --left > 0) return true;
       nodes.push_back(found);
       return false;
     });
     return 1;
   }
-  XQueryWalkAlongAxis(node, _axis, [&](NSXMLNode* found) {
+  const auto add = [&](NSXMLNode* found) {
     if (test.matches(found)) nodes.push_back(found);
     return true;
-  });
+  };
+  if (_trail != noTrail && !run.setsEveryFocus) {
+    run.trail(_trail).walk(node, axis, add);
+  } else {
+    XQueryWalkAlongAxis(node, axis, add);
+  }
   return 0;
 }
 
@@ -392,7 +408,7 @@ void XQueryPathExpr::findShortcuts() {
         step && !step->testMayRaise() && step->hasRepeatablePredicates(variablesMayChange);
     if (!isRepeatable) break;
     const auto* next = dyn_cast<XQueryAxisStep>(step->next());
-    step->_absorbsNext = step->isDescendantShorthand() && next && next->takesPlainChildren();
+    step->_absorbsNext = step->isDescendantShorthand() && next && next->mayTakeDescendants();
     const auto* previous = i == 0 ? nullptr : dyn_cast<XQueryAxisStep>(steps[i - 1]);
     const bool keepsTrail = !nodesMayGo && step->mayWalkTwice(previous);
     step->_trail = keepsTrail ? _trailCount++ : XQueryAxisStep::noTrail;

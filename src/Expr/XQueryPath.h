@@ -68,6 +68,10 @@ class XQueryStep : public NSCounted {
   void filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex, XQueryContext& context) const;
   // Whether every predicate may be evaluated again (XQueryIsRepeatable).
   bool hasRepeatablePredicates(bool variablesMayChange) const;
+  // Whether every predicate keeps an item for what it finds true of it, wherever the item stands,
+  // and without loading documents. The predicates are repeatable: none of them can ask for a
+  // position, so one that never answers a number cannot tell it.
+  bool hasPredicatesOfTruth() const;
   // The position that predicate `index` asks for when it is a numeric literal.
   const std::optional<uint64_t>& literalPosition(size_t index) const {
     return _literalPositions[index];
@@ -126,10 +130,12 @@ class XQueryAxisStep : public XQueryStep {
   void stream(int axis, NSXMLNode* node, XQueryPathRun& run) const;
   template <class Matches>
   void streamMatching(int axis, NSXMLNode* node, XQueryPathRun& run, Matches matches) const;
-  void filter(NSXMLNode* node, XQueryPathRun& run) const;
-  size_t collect(NSXMLNode* node, std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const;
+  void filter(int axis, NSXMLNode* node, XQueryPathRun& run) const;
+  size_t collect(int axis, NSXMLNode* node, std::vector<NSXMLNode*>& nodes,
+                 XQueryPathRun& run) const;
   bool isDescendantShorthand() const;
-  bool takesPlainChildren() const;
+  bool mayTakeDescendants() const;
+  void take(int axis, NSXMLNode* node, XQueryPathRun& run) const;
   bool mayWalkTwice(const XQueryAxisStep* previous) const;
   bool absorbsNextFor(const NSXMLNode* node, const XQueryPathRun& run) const;
   friend class XQueryPathExpr;

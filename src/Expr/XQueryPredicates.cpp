@@ -5,14 +5,19 @@
 // An error in a predicate drops the item it arose for and nothing more: a path over irregular data
 // keeps what fits. Reaching an engine limit is no such error and ends the evaluation.
 #include "Eval/XQueryContextInternal.h"
+#include "Expr/XQueryCallExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
+#include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQueryPath.h"
+#include "Expr/XQueryReads.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
+
+#include <algorithm>
 
 namespace xquery {
 namespace {
@@ -67,6 +72,32 @@ void keepNodes(std::vector<NSXMLNode*>& nodes, const XQueryExpr& predicate,
   nodes.resize(kept);
 }
 
+// Whether the expression's value is never a number.
+bool answersTruth(const XQueryExpr* expr) {
+  const auto* list = dyn_cast<XQueryExprList>(expr);
+  while (list && list->count() == 1) {
+    expr = list->objectAtIndex(0);
+    list = dyn_cast<XQueryExprList>(expr);
+  }
+  if (const auto* call = dyn_cast<XQueryCallExpr>(expr)) return call->answersTruth();
+  if (const auto* path = dyn_cast<XQueryPathExpr>(expr)) {
+    const XQueryStep* last = path->step();
+    while (last && last->next()) last = last->next();
+    return isa<XQueryAxisStep>(last);
+  }
+  const auto* operation = dyn_cast<XQueryOperatorExpr>(expr);
+  if (!operation) return false;
+  switch (XQueryOperatorExpr::operatorClassification(operation->operatorType())) {
+    case 1:  // logical
+    case 5:  // value comparison
+    case 6:  // general comparison
+    case 7:  // node comparison
+      return true;
+    default:
+      return false;
+  }
+}
+
 }  // namespace
 
 bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t position,
@@ -87,6 +118,12 @@ std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicat
   const XQueryLiteral* literal = literalIn(predicate);
   if (!literal || !XQueryIsNumericType(literal->literalValue().get())) return std::nullopt;
   return cast<NSNumber>(literal->literalValue())->unsignedIntegerValue();
+}
+
+bool XQueryStep::hasPredicatesOfTruth() const {
+  return std::all_of(_predicates.begin(), _predicates.end(), [](const auto& predicate) {
+    return predicate && answersTruth(predicate.get()) && !XQueryReadsOf(*predicate).loads;
+  });
 }
 
 Value XQueryStep::handlePreicatesFromIndex(size_t index, Value items,

@@ -332,6 +332,21 @@ bool XQueryBuiltInFunction::loadsDocuments() const {
   return _proc == fn_doc;
 }
 
+bool XQueryBuiltInFunction::answersTruth() const {
+  constexpr auto truths = std::to_array<XQueryProcedure>({
+      fn_boolean,
+      fn_contains,
+      fn_deep_equal,
+      fn_empty,
+      fn_ends_with,
+      fn_exists,
+      fn_matches,
+      fn_not,
+      fn_starts_with,
+  });
+  return std::find(truths.begin(), truths.end(), _proc) != truths.end();
+}
+
 XQueryProcedure XQueryBuiltInFunction::functionForQName(const Ref<XQueryQName>& qName) {
   const XQueryBuiltInFunction* entry = entryForQName(qName);
   return entry ? entry->proc() : nullptr;

@@ -34,6 +34,8 @@ class XQueryBuiltInFunction : public NSCounted {
   bool readsArgumentsOnly() const { return _readsArgumentsOnly; }
   // Whether a call asks the host for a document, which the host can tell.
   bool loadsDocuments() const;
+  // Whether the function answers truth values and nothing else.
+  bool answersTruth() const;
 
   // Null for a name that is not registered.
   static XQueryProcedure functionForQName(const Ref<XQueryQName>& qName);

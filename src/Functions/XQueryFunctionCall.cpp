@@ -66,6 +66,7 @@ void XQueryFunctionCall::bindInfoForProlog(XQueryProlog& prolog) {
       _function = entry->proc();
       _readsArgumentsOnly = entry->readsArgumentsOnly() && argumentCount() > 0;
       _loadsDocuments = entry->loadsDocuments();
+      _answersTruth = entry->answersTruth();
     }
     if (!_function) _functionDecl = prolog.functionInfoForSignature({qName, argumentCount()});
   }
