@@ -9,12 +9,7 @@
 namespace xquery {
 namespace {
 
-using functiontest::answer;
-using functiontest::call;
-using functiontest::integer;
-using functiontest::refusedCounts;
-using functiontest::string;
-using functiontest::untyped;
+using namespace functiontest;
 
 Value hex(std::string_view digits) {
   return XQueryHexBinary::binaryWithString(NSStringView::ascii(digits));

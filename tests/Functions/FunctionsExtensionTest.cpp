@@ -10,13 +10,7 @@
 namespace xquery {
 namespace {
 
-using functiontest::answer;
-using functiontest::call;
-using functiontest::document;
-using functiontest::integer;
-using functiontest::refusedCounts;
-using functiontest::show;
-using functiontest::string;
+using namespace functiontest;
 
 constexpr std::string_view refusedEval = "error 17 line 1 invalid arguments to function - ext:eval";
 

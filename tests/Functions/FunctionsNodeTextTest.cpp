@@ -4,13 +4,7 @@
 namespace xquery {
 namespace {
 
-using functiontest::answer;
-using functiontest::call;
-using functiontest::document;
-using functiontest::integer;
-using functiontest::refusedCounts;
-using functiontest::string;
-using functiontest::untyped;
+using namespace functiontest;
 
 std::string parsed(std::string_view text, std::string_view letters) {
   const Value arguments[] = {string(text), string(letters)};

@@ -1,30 +1,16 @@
 #include "Functions/FunctionsTesting.h"
 #include "Functions/FunctionsXSLT.h"
 #include "Platform/LoadingTestSupport.h"
+#include "Platform/StylesheetTestSupport.h"
 
 #include <chrono>
 
 namespace xquery {
 namespace {
 
-using functiontest::answer;
-using functiontest::call;
-using functiontest::document;
-using functiontest::integer;
-using functiontest::refusedCounts;
-using functiontest::show;
-using functiontest::string;
-using functiontest::untyped;
+using namespace functiontest;
 
 constexpr std::string_view refused = "error 17 line 1 invalid arguments to function - ext:xslt";
-
-std::string stylesheet(std::string_view content) {
-  return "<xsl:stylesheet version='1.0' xmlns:xsl='http://www.w3.org/1999/XSL/Transform'>" +
-         std::string(content) + "</xsl:stylesheet>";
-}
-std::string root(std::string_view content) {
-  return stylesheet("<xsl:template match='/'>" + std::string(content) + "</xsl:template>");
-}
 
 // What the query answers with the stylesheet as $s.
 std::string with(std::string_view style, std::string_view query,
@@ -134,12 +120,7 @@ TEST(XSLT, KeepsToTheLoadingPolicy) {
 }
 
 TEST(XSLT, EndsAtTheLimitsOfTheEvaluation) {
-  const std::string endless = stylesheet(
-      "<xsl:template match='/'><xsl:call-template name='t'/></xsl:template>"
-      "<xsl:template name='t'><xsl:param name='n' select='60'/><x/><xsl:if test='$n'>"
-      "<xsl:call-template name='t'><xsl:with-param name='n' select='$n - 1'/></xsl:call-template>"
-      "<xsl:call-template name='t'><xsl:with-param name='n' select='$n - 1'/></xsl:call-template>"
-      "</xsl:if></xsl:template>");
+  const std::string endless = doubling(60, "<x/>");
   for (const std::string_view query :
        {"ext:xslt(/, $s)", "(1, 2)[ext:xslt($d, $s)]", "ext:eval('ext:xslt(/, string(/))', $t)"}) {
     Settings settings;

@@ -1,5 +1,6 @@
 #include "Platform/LibXSLT.h"
 #include "Platform/LoadingTestSupport.h"
+#include "Platform/StylesheetTestSupport.h"
 #include "Platform/WorkMeter.h"
 #include "Platform/XMLStylesheet.h"
 #include "xquery/Error.h"
@@ -16,17 +17,6 @@
 
 namespace xquery {
 namespace {
-
-// A stylesheet of those top-level elements.
-std::string stylesheet(std::string_view content, std::string_view attributes = "") {
-  return "<xsl:stylesheet version='1.0' xmlns:xsl='http://www.w3.org/1999/XSL/Transform' " +
-         std::string(attributes) + ">" + std::string(content) + "</xsl:stylesheet>";
-}
-// A stylesheet of one template for the root.
-std::string root(std::string_view content, std::string_view attributes = "") {
-  return stylesheet("<xsl:template match='/'>" + std::string(content) + "</xsl:template>",
-                    attributes);
-}
 
 Ref<NSXMLDocument> document(std::string_view xml) {
   const auto parsed = NSXMLDocument::documentWithData(xml, NSXMLNodePreserveWhitespace);
@@ -515,18 +505,11 @@ class Deadline final : public WorkWatcher {
   std::chrono::steady_clock::time_point _end;
 };
 
-const std::string exponential = stylesheet(
-    "<xsl:template match='/'><xsl:call-template name='t'/></xsl:template>"
-    "<xsl:template name='t'><xsl:param name='n' select='500'/><xsl:if test='$n'>"
-    "<xsl:call-template name='t'><xsl:with-param name='n' select='$n - 1'/></xsl:call-template>"
-    "<xsl:call-template name='t'><xsl:with-param name='n' select='$n - 1'/></xsl:call-template>"
-    "</xsl:if></xsl:template>");
-
 TEST(XMLStylesheet, EndsAtADeadline) {
   const std::string xml = "<a>" + nested("<b/>", "", 20000) + "</a>";
   const std::string slowExpression =
       root("<r><xsl:value-of select='count(//*[count(//*[count(//*) > 0]) > 0])'/></r>");
-  for (const std::string& style : {exponential, slowExpression}) {
+  for (const std::string& style : {doubling(500), slowExpression}) {
     const auto doc = document(xml);
     const auto begin = std::chrono::steady_clock::now();
     const Deadline deadline(50);
@@ -580,12 +563,7 @@ TEST(XMLStylesheet, IsNotBegunWhileTooManyAreLeftBehind) {
 }
 
 TEST(XMLStylesheet, EndsWhereTreesTakeTooMuchMemory) {
-  const std::string style = stylesheet(
-      "<xsl:template match='/'><r><xsl:call-template name='t'/></r></xsl:template>"
-      "<xsl:template name='t'><xsl:param name='n' select='40'/><x/><xsl:if test='$n'>"
-      "<xsl:call-template name='t'><xsl:with-param name='n' select='$n - 1'/></xsl:call-template>"
-      "<xsl:call-template name='t'><xsl:with-param name='n' select='$n - 1'/></xsl:call-template>"
-      "</xsl:if></xsl:template>");
+  const std::string style = doubling(40, "<x/>");
   const auto doc = document("<a/>");
   const Deadline deadline(100000);
   workMeter.mostValueBytes = workMeter.valueBytes + (int64_t{16} << 20);
