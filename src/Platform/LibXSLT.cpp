@@ -7,6 +7,7 @@
 #include <libxml/parser.h>
 #include <libxml/tree.h>
 #include <libxml/xmlerror.h>
+#include <libxml/xmlmemory.h>
 #include <libxslt/documents.h>
 #include <libxslt/imports.h>
 #include <libxslt/security.h>
@@ -22,7 +23,10 @@
 #include <csignal>
 #include <cstdarg>
 #include <cstdio>
+#include <cstdlib>
+#include <cstring>
 #include <exception>
+#include <malloc.h>
 #include <memory>
 #include <mutex>
 #include <new>
@@ -49,7 +53,6 @@ constexpr int mostVariables = 15000;
 constexpr auto timeBetweenLooks = std::chrono::milliseconds(5);
 constexpr auto timeToStop = std::chrono::milliseconds(40);
 constexpr size_t longestFailure = 1000;
-constexpr size_t bytesPerNode = sizeof(xmlNode);
 
 template <auto function>
 struct Freed {
@@ -73,11 +76,11 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
   void hear(const char* format, va_list arguments);
   void hear(const char* text);
   void noteNode();
-  void noteNodeFreed() { _nodes.fetch_sub(1, std::memory_order_relaxed); }
+  void noteBytes(int64_t more) { _bytes.fetch_add(more, std::memory_order_relaxed); }
 
  private:
   struct Request {
-    std::string URL;
+    const char* URL;
     xmlDictPtr dictionary;
     bool isStylesheet;
     LibXMLDocument document;
@@ -86,6 +89,7 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
   // On the thread of the transformation.
   static void* start(void* self);
   void work();
+  bool finish();  // whether nobody waits for it
   Stylesheet compile();
   void apply(xsltStylesheet& stylesheet);
   void setContext(xsltTransformContext* context);
@@ -102,13 +106,14 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
 
   const LibXSLTTask& _task;  // not for the thread of the transformation
   const NSXMLDocument::XSLTArguments _arguments;
+  std::vector<const char*> _argumentTexts;  // name and value by turns, and null
   LibXMLDocument _document;
   LibXMLDocument _stylesheet;
   LibXMLDocument _result;
   bool _hasTextResult = false;
   std::string _failure;
   const char* _stackTop = nullptr;
-  std::atomic<int64_t> _nodes = 0;
+  std::atomic<int64_t> _bytes = 0;  // taken on the thread less those that it gave back
   std::atomic<bool> _nestsTooDeeply = false;
   std::shared_ptr<Transformation> _self;  // for the thread to take
 
@@ -127,8 +132,51 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
 // The transformation of this thread.
 thread_local Transformation* current = nullptr;
 
+// Stands between libxml2 and malloc to count what transformations take. Texts grow by doubling as
+// easily as trees do, and nothing else tells how long they are. Nothing is refused here, since
+// libxml2 does not come out of every such refusal well.
+class Counting {
+ public:
+  // Of the blocks of another allocator, which a host may have given to libxml2, sizes are unknown.
+  static void begin() { replace({std::free, std::malloc, std::realloc}, {free, malloc, realloc}); }
+  static void end() { replace({free, malloc, realloc}, {std::free, std::malloc, std::realloc}); }
+
+ private:
+  struct Functions {
+    xmlFreeFunc free;
+    xmlMallocFunc malloc;
+    xmlReallocFunc realloc;
+    bool operator==(const Functions&) const = default;
+  };
+
+  static void replace(const Functions& before, const Functions& after) {
+    Functions found;
+    xmlStrdupFunc strdup;  // takes its memory from the others
+    xmlMemGet(&found.free, &found.malloc, &found.realloc, &strdup);
+    if (found == before) xmlMemSetup(after.free, after.malloc, after.realloc, strdup);
+  }
+  static int64_t sizeOf(void* block) { return static_cast<int64_t>(malloc_usable_size(block)); }
+
+  static void* malloc(size_t size) {
+    void* const block = std::malloc(size);
+    if (current) current->noteBytes(sizeOf(block));
+    return block;
+  }
+  static void* realloc(void* block, size_t size) {
+    const int64_t before = current ? sizeOf(block) : 0;
+    void* const moved = std::realloc(block, size);
+    if (current && moved) current->noteBytes(sizeOf(moved) - before);
+    return moved;
+  }
+  static void free(void* block) {
+    if (current) current->noteBytes(-sizeOf(block));
+    std::free(block);
+  }
+};
+
 // Threads that nobody waits for any more. libxml2 releases what it shares when the process ends,
-// whoever still uses it: they are given a little time to be done with it.
+// whoever still uses it: they are given a little time to be done with it, and where that is not
+// enough, the allocator stays ours, which makes libxml2 release nothing.
 class LeftBehind {
  public:
   ~LeftBehind() {
@@ -137,6 +185,7 @@ class LeftBehind {
     for (int pauses = 0; count > 0 && pauses < mostPauses; ++pauses) {
       std::this_thread::sleep_for(pause);
     }
+    if (count == 0) Counting::end();
   }
   std::atomic<int> count = 0;
 };
@@ -177,45 +226,50 @@ void noteNode(xmlNodePtr) {
   if (current) current->noteNode();
 }
 
-void noteNodeFreed(xmlNodePtr) {
-  if (current) current->noteNodeFreed();
-}
-
 void initialise() {
   xmlInitParser();
+  Counting::begin();
   xsltInit();
   otherLoader = xsltDocDefaultLoader;
   xsltSetLoaderFunc(loadDocument);
   otherErrorFunction = xsltGenericError;
   otherErrorContext = xsltGenericErrorContext;
   xsltSetGenericErrorFunc(nullptr, hearError);
-  // These make libxml2 look at what each thread has set; the main thread's own is put back.
+  // This makes libxml2 look at what each thread has set; the main thread's own is put back.
   xmlRegisterNodeDefault(xmlRegisterNodeDefault(nullptr));
-  xmlDeregisterNodeDefault(xmlDeregisterNodeDefault(nullptr));
 }
 
 // --- on the thread of the transformation ---------------------------------------------------------
 
+// Nothing here asks for memory of our own: an exception could not pass the frames of C, and would
+// end the process where there are none.
+
 void* Transformation::start(void* self) {
-  const auto transformation = std::move(static_cast<Transformation*>(self)->_self);
+  auto transformation = std::move(static_cast<Transformation*>(self)->_self);
   transformation->work();
+  const bool wasLeftBehind = transformation->finish();
+  transformation.reset();
+  // Not before, since what it freed is libxml2's.
+  if (wasLeftBehind) --leftBehind.count;
   return nullptr;
 }
 
 void Transformation::work() {
   _stackTop = static_cast<const char*>(__builtin_frame_address(0));
   current = this;
-  // These four are of the thread and go with it.
+  // These three are of the thread and go with it.
   xmlSetStructuredErrorFunc(nullptr, hearStructuredError);
   xmlSetGenericErrorFunc(nullptr, hearError);
   xmlRegisterNodeDefaultValue = xquery::noteNode;
-  xmlDeregisterNodeDefaultValue = xquery::noteNodeFreed;
   if (const Stylesheet stylesheet = compile()) apply(*stylesheet);
   current = nullptr;
+}
+
+bool Transformation::finish() {
   const std::lock_guard lock(_mutex);
   _isDone = true;
-  if (_isLeftBehind) --leftBehind.count;
   _changed.notify_all();
+  return _isLeftBehind;
 }
 
 Stylesheet Transformation::compile() {
@@ -252,14 +306,8 @@ void Transformation::apply(xsltStylesheet& stylesheet) {
   context->xinclude = 0;
   context->maxTemplateDepth = mostTemplateLevels;
   context->maxTemplateVars = mostVariables;
-  std::vector<const char*> arguments;
-  for (const auto& [name, value] : _arguments) {
-    arguments.push_back(name.c_str());
-    arguments.push_back(value.c_str());
-  }
-  arguments.push_back(nullptr);
   setContext(context.get());
-  LibXMLDocument result(xsltApplyStylesheetUser(&stylesheet, _document.get(), arguments.data(),
+  LibXMLDocument result(xsltApplyStylesheetUser(&stylesheet, _document.get(), _argumentTexts.data(),
                                                 nullptr, nullptr, context.get()));
   setContext(nullptr);
   // There is a result of what was done before a failure as well.
@@ -304,12 +352,11 @@ void Transformation::hear(const char* format, va_list arguments) {
 }
 
 void Transformation::hear(const char* text) {
-  if (_failure.size() < longestFailure) _failure.append(text);
+  _failure.append(text, std::min(std::strlen(text), longestFailure - _failure.size()));
 }
 
 // Trees are copied with a node per level of the recursion, so that this is called at its bottom.
 void Transformation::noteNode() {
-  _nodes.fetch_add(1, std::memory_order_relaxed);
   const auto* frame = static_cast<const char*>(__builtin_frame_address(0));
   if (static_cast<size_t>(_stackTop - frame) < stackBytesBeforeStop || _nestsTooDeeply) return;
   _nestsTooDeeply = true;
@@ -324,7 +371,14 @@ Transformation::Transformation(const LibXSLTTask& task)
       _arguments(task.arguments),
       _document(LibXMLDocumentFrom(task.document, LibXSLTMostDocumentLevels, task.documentURL)),
       _stylesheet(
-          LibXMLDocumentFrom(task.stylesheet, LibXSLTMostStylesheetLevels, task.stylesheetURL)) {}
+          LibXMLDocumentFrom(task.stylesheet, LibXSLTMostStylesheetLevels, task.stylesheetURL)) {
+  for (const auto& [name, value] : _arguments) {
+    _argumentTexts.push_back(name.c_str());
+    _argumentTexts.push_back(value.c_str());
+  }
+  _argumentTexts.push_back(nullptr);
+  _failure.reserve(longestFailure);
+}
 
 // The handlers of the host's signals are not run on this thread.
 bool Transformation::startThread(pthread_t& thread) {
@@ -357,7 +411,8 @@ bool Transformation::attend() {
       lastMoment = Clock::now() + timeToStop;
     }
     if (_isEnding || _nestsTooDeeply) stop();
-    if (request) {
+    // Once it is ending, nothing that was asked for meanwhile is answered either.
+    if (request || _isEnding) {
       _request = nullptr;
       _changed.notify_all();
     }
@@ -382,8 +437,7 @@ void Transformation::look(Request* request) {
 bool Transformation::exceedsMemory() const {
   const WorkMeter& meter = workMeter;
   if (meter.mostValueBytes == INT64_MAX) return false;
-  const int64_t nodes = std::max<int64_t>(_nodes.load(std::memory_order_relaxed), 0);
-  return nodes > (meter.mostValueBytes - meter.valueBytes) / static_cast<int64_t>(bytesPerNode);
+  return _bytes.load(std::memory_order_relaxed) > meter.mostValueBytes - meter.valueBytes;
 }
 
 void Transformation::answer(Request& request) {

@@ -140,5 +140,34 @@ TEST(XSLT, EndsAtTheLimitsOfTheEvaluation) {
   EXPECT_EQ(settings.answer("ext:xslt(/, $s)", endless), "error 0 limit: memory ceiling reached");
 }
 
+// A text doubles its length on each of some thirty levels, which makes neither nodes nor work.
+TEST(XSLT, TextsCountAsMemory) {
+  const auto doubled = [](int levels, std::string_view twice) {
+    return stylesheet(
+        "<xsl:template match='/'><xsl:call-template name='t'/></xsl:template>"
+        "<xsl:template name='t'><xsl:param name='n' select='" +
+        std::to_string(levels) +
+        "'/><xsl:param name='s' select=\"'x'\"/><xsl:choose><xsl:when test='$n'>"
+        "<xsl:call-template name='t'><xsl:with-param name='n' select='$n - 1'/>" +
+        std::string(twice) +
+        "</xsl:call-template></xsl:when><xsl:otherwise><r><xsl:value-of "
+        "select='string-length($s)'/></r></xsl:otherwise></xsl:choose></xsl:template>");
+  };
+  for (const std::string_view twice :
+       {"<xsl:with-param name='s' select='concat($s, $s)'/>",
+        "<xsl:with-param name='s'><xsl:value-of select='$s'/><xsl:value-of select='$s'/>"
+        "</xsl:with-param>"}) {
+    Settings settings;
+    XQueryLimits limits;
+    limits.memoryCeiling = uint64_t{16} << 20;
+    settings.context->contextSetLimits(limits);
+    EXPECT_TRUE(
+        settings.answer("string(ext:xslt(/, $s))", doubled(10, twice)).starts_with("(string "));
+    EXPECT_EQ(settings.answer("ext:xslt(/, $s)", doubled(28, twice)),
+              "error 0 limit: memory ceiling reached")
+        << twice;
+  }
+}
+
 }  // namespace
 }  // namespace xquery

@@ -8,6 +8,7 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
+#include <cstdlib>
 #include <filesystem>
 #include <map>
 #include <stdexcept>
@@ -538,6 +539,23 @@ TEST(XMLStylesheet, IsLeftBehindWhereItCannotBeStopped) {
     EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::milliseconds(500));
   }
   EXPECT_EQ(applied(*doc, root("<r/>")), "<r/>");
+}
+
+// What is left behind uses libraries that release what they share when the process ends.
+TEST(XMLStylesheetDeathTest, TheProcessEndsInOrderWhileOneIsLeftBehind) {
+  GTEST_FLAG_SET(death_test_style, "threadsafe");
+  const auto leaveAndEnd = [] {
+    const auto doc = document("<a/>");
+    const std::string style = slowToCompile(7000);
+    try {
+      const Deadline deadline(10);
+      applied(*doc, style);
+    } catch (const NSException&) {
+      std::exit(0);
+    }
+    std::exit(1);
+  };
+  EXPECT_EXIT(leaveAndEnd(), testing::ExitedWithCode(0), "^$");
 }
 
 TEST(XMLStylesheet, IsNotBegunWhileTooManyAreLeftBehind) {
