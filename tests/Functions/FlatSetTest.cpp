@@ -1,8 +1,8 @@
 #include "Functions/FlatSet.h"
+#include "Platform/ProcessorTime.h"
 
 #include <gtest/gtest.h>
 
-#include <chrono>
 #include <functional>
 #include <random>
 #include <set>
@@ -65,11 +65,11 @@ TEST(FlatSet, KeepsTheOrderOfInsertion) {
 
 // Every pair compared would take 10^11 steps.
 TEST(FlatSet, KeysOfOneHashStayFast) {
-  const auto start = std::chrono::steady_clock::now();
+  const double start = processorSeconds();
   Numbers<0> set;
   for (uint64_t key = 0; key < 300000; ++key) EXPECT_TRUE(set.insert(key));
   for (uint64_t key = 0; key < 300000; ++key) EXPECT_FALSE(set.insert(key));
-  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
+  EXPECT_LT(processorSeconds() - start, 10);
 }
 
 }  // namespace

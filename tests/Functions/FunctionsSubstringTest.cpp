@@ -1,9 +1,9 @@
 #include "Functions/FunctionsSubstring.h"
 #include "Functions/StringTesting.h"
+#include "Platform/ProcessorTime.h"
 #include "Types/XQueryAtomization.h"
 
 #include <algorithm>
-#include <chrono>
 #include <cmath>
 #include <limits>
 
@@ -115,9 +115,9 @@ TEST(Contains, AHostilePatternTakesTimeInProportionToTheText) {
     const std::u16string half(500000, unit);
     const Value text = typedText(half + half);
     const Value part = typedText(half + u'b' + half.substr(1));
-    const auto start = std::chrono::steady_clock::now();
+    const double start = processorSeconds();
     EXPECT_EQ(call(fn_contains, {text, part}), "false");
-    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5));
+    EXPECT_LT(processorSeconds() - start, 5);
   }
 }
 

@@ -131,7 +131,7 @@ TEST(XSLT, EndsAtTheLimitsOfTheEvaluation) {
     const std::string text = settings.answer(
         "let $d := /, $t := document { text { $s } } return " + std::string(query), endless);
     EXPECT_EQ(text, "error 0 limit: deadline passed") << query;
-    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(1));
+    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(20));
   }
   Settings settings;
   XQueryLimits limits;

@@ -1,7 +1,7 @@
 #include "Functions/FunctionsTesting.h"
 #include "Functions/XQueryValueSet.h"
+#include "Platform/ProcessorTime.h"
 
-#include <chrono>
 #include <random>
 
 namespace xquery {
@@ -116,12 +116,12 @@ TEST(ValueSet, ManyIntegersOfOneDoubleStayFast) {
     const std::string digits = std::to_string(count + index);
     values.push_back(decimal("1" + std::string(40, '0') + digits));
   }
-  const auto start = std::chrono::steady_clock::now();
+  const double start = processorSeconds();
   XQueryValueSet set;
   for (const Value& value : values) EXPECT_TRUE(set.insert(*value));
   EXPECT_FALSE(set.insert(*values.back()));
   // Every pair compared would take many times as long.
-  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5));
+  EXPECT_LT(processorSeconds() - start, 5);
 }
 
 }  // namespace

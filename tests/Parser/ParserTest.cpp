@@ -2,12 +2,12 @@
 #include "Parser/XQueryParser.h"
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
+#include "Platform/ProcessorTime.h"
 
 #include <gtest/gtest.h>
 
 #include <atomic>
 #include <cstdlib>
-#include <ctime>
 #include <functional>
 #include <random>
 #include <thread>
@@ -314,13 +314,6 @@ TEST(Parser, NestingWithinTheStackIsParsed) {
   EXPECT_FALSE(parsed(repeated("<a>", 3400) + repeated("</a>", 3400))->parsedModule());
 }
 
-// Of this thread, so that a busy machine does not disturb the measure.
-double processorSeconds() {
-  timespec now = {};
-  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &now);
-  return static_cast<double>(now.tv_sec) + 1e-9 * static_cast<double>(now.tv_nsec);
-}
-
 double parseSeconds(const std::string& query) {
   const double start = processorSeconds();
   const auto parser = parsed(query);
@@ -332,11 +325,8 @@ double parseSeconds(const std::string& query) {
 }
 
 void expectLinear(const std::function<std::string(size_t)>& query, size_t size) {
-  parseSeconds(query(size / 8));
-  const double small = parseSeconds(query(size / 8));
-  const double large = parseSeconds(query(size));
-  // Eight times the work; a quadratic parser would take 64 times as long.
-  EXPECT_LT(large, 24 * small + 0.05);
+  EXPECT_TRUE(growsInProportion([&](size_t each) { return parseSeconds(query(each)); }, size))
+      << query(4);
 }
 
 TEST(Parser, LongQueriesTakeLinearTime) {

@@ -1,11 +1,11 @@
 // Both representations of a text must give the same answers, so most tests ask every question of
 // all four pairings over generated texts and compare with a plain implementation.
+#include "Platform/ProcessorTime.h"
 #include "xquery/String.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <chrono>
 #include <random>
 #include <string>
 #include <vector>
@@ -103,9 +103,9 @@ TEST(StringView, WidePatternIsNotFoundInNarrowTextUnlessItsUnitsAre) {
 TEST(StringView, HostileSearchTakesLinearTime) {
   const std::u16string text = std::u16string(400000, u'\u0101');
   const std::u16string pattern = std::u16string(200000, u'\u0101') + u"\u0102";
-  const auto start = std::chrono::steady_clock::now();
+  const double start = processorSeconds();
   EXPECT_EQ(Both::wideView(text).find(Both::wideView(pattern)), NSStringView::notFound);
-  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2));
+  EXPECT_LT(processorSeconds() - start, 2);
 }
 
 TEST(StringView, StartsAndEndsAgreeWithSubstrings) {

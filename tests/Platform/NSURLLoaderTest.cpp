@@ -230,6 +230,10 @@ TEST_F(Server, EndlessHeadersAreCutOff) {
   EXPECT_NE(failure("/a"), "none");
 }
 
+// What goes on for ever is given up long before the 60 seconds that hold without a setting. Only
+// the clock on the wall can tell, hence the room for a machine that has other things to do.
+constexpr milliseconds notForEver(30000);
+
 TEST_F(Server, ASlowBodyRunsOutOfTime) {
   loading.limits.totalTimeout = milliseconds(200);
   server.handle("/a", [](HTTPServer::Connection& connection) {
@@ -238,7 +242,7 @@ TEST_F(Server, ASlowBodyRunsOutOfTime) {
   });
   const auto start = Clock::now();
   EXPECT_NE(failure("/a"), "none");
-  EXPECT_LT(Clock::now() - start, milliseconds(5000));
+  EXPECT_LT(Clock::now() - start, notForEver);
 }
 
 TEST_F(Server, AServerThatSaysNothingRunsOutOfTime) {
@@ -246,7 +250,7 @@ TEST_F(Server, AServerThatSaysNothingRunsOutOfTime) {
   server.handle("/a", [](HTTPServer::Connection& connection) { connection.waitForEnd(); });
   const auto start = Clock::now();
   EXPECT_NE(failure("/a"), "none");
-  EXPECT_LT(Clock::now() - start, milliseconds(5000));
+  EXPECT_LT(Clock::now() - start, notForEver);
 }
 
 TEST_F(Server, TheTimeIsThatOfAllRedirectsTogether) {
@@ -258,7 +262,7 @@ TEST_F(Server, TheTimeIsThatOfAllRedirectsTogether) {
   });
   const auto start = Clock::now();
   EXPECT_NE(failure("/a"), "none");
-  EXPECT_LT(Clock::now() - start, milliseconds(5000));
+  EXPECT_LT(Clock::now() - start, notForEver);
 }
 
 TEST_F(Server, ABodyThatBreaksOffIsNothing) {
@@ -293,7 +297,7 @@ TEST_F(Server, ACheckpointMayEndTheWait) {
     if (Clock::now() - start > milliseconds(100)) throw Enough();
   });
   EXPECT_THROW((void)loader->load(*URLOf(server.URL("/a")), XQueryLoadPurpose::Document), Enough);
-  EXPECT_LT(Clock::now() - start, milliseconds(3000));
+  EXPECT_LT(Clock::now() - start, notForEver);
 }
 
 // --- the host's own loader -----------------------------------------------------------------------

@@ -10,6 +10,7 @@
 #include <chrono>
 #include <cstdlib>
 #include <filesystem>
+#include <iterator>
 #include <map>
 #include <stdexcept>
 #include <string>
@@ -515,7 +516,8 @@ TEST(XMLStylesheet, EndsAtADeadline) {
     const auto begin = std::chrono::steady_clock::now();
     const Deadline deadline(50);
     EXPECT_THROW(applied(*doc, style), NSException);
-    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::milliseconds(1000));
+    // Either takes longer than anybody has time; how late a busy machine is does not matter here.
+    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(20));
   }
 }
 
@@ -529,14 +531,25 @@ std::string slowToCompile(int templates) {
   return stylesheet(content);
 }
 
+ptrdiff_t threadCount() {
+  return std::distance(std::filesystem::directory_iterator("/proc/self/task"), {});
+}
+
+// Until what other tests left behind is done as well.
+void waitForTheLastThread() {
+  for (int turn = 0; turn < 6000 && threadCount() > 1; ++turn) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(10));
+  }
+}
+
 TEST(XMLStylesheet, IsLeftBehindWhereItCannotBeStopped) {
-  const std::string style = slowToCompile(7000);
+  waitForTheLastThread();
+  const std::string style = slowToCompile(15000);
   const auto doc = document("<a/>");
   for (int turn = 0; turn < 2; ++turn) {
     const Deadline deadline(10);
-    const auto begin = std::chrono::steady_clock::now();
     EXPECT_THROW(applied(*doc, style), NSException);
-    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::milliseconds(500));
+    EXPECT_GT(threadCount(), 1) << "the call waited for the thread";
   }
   EXPECT_EQ(applied(*doc, root("<r/>")), "<r/>");
 }
@@ -559,6 +572,7 @@ TEST(XMLStylesheetDeathTest, TheProcessEndsInOrderWhileOneIsLeftBehind) {
 }
 
 TEST(XMLStylesheet, IsNotBegunWhileTooManyAreLeftBehind) {
+  waitForTheLastThread();
   const std::string style = slowToCompile(25000);
   const auto doc = document("<a/>");
   int ended = 0;

@@ -1,7 +1,6 @@
+#include "Platform/ProcessorTime.h"
 #include "Types/XQueryDataMatch.h"
 #include "TypesTestSupport.h"
-
-#include <chrono>
 
 namespace xquery {
 namespace {
@@ -106,13 +105,13 @@ TEST(DataMatchAll, AlternativesKeepTheirOrderAfterOneIsExhausted) {
 TEST(DataMatchAll, AbsentAlternativesAreLookedForOnce) {
   std::string bytes;
   while (bytes.size() < 500000) bytes += "<>";
-  [[maybe_unused]] const auto start = std::chrono::steady_clock::now();
+  [[maybe_unused]] const double start = processorSeconds();
   const Ref<NSData> searched = NSData::dataWithBytes(std::move(bytes));
   const Value slices =
       XQueryDataMatch(*searched, anyOf({"absent", "<"}).get(), anyOf({"missing", ">"}).get(), true);
   EXPECT_EQ(cast<NSArray>(slices)->count(), 250000U);
 #ifndef __SANITIZE_ADDRESS__
-  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5));
+  EXPECT_LT(processorSeconds() - start, 5);
 #endif
 }
 
