@@ -88,8 +88,9 @@ constexpr size_t LibXMLAttributeCost = 16;
 
 // libxml2 compares every attribute of a start tag with every other, and every declaration too, and
 // cannot be interrupted meanwhile: a tag of a million would keep it busy for minutes. Somewhat more
-// than this many, some hundredths of a second of work, are refused.
-constexpr int LibXMLMostAttributes = 12000;
+// than this many are refused: twenty milliseconds of work, so that an evaluation which is told to
+// end while a document is read ends within its tenth of a second on a slow machine too.
+constexpr int LibXMLMostAttributes = 6000;
 
 // Whether the document was well formed; else `error` says what is wrong, and where.
 bool parseWithLibXML(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error);
