@@ -4,8 +4,7 @@
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 
-#include <cstddef>
-#include <cstdint>
+#include <algorithm>
 #include <pthread.h>
 
 namespace xquery {
@@ -19,6 +18,11 @@ constexpr size_t reserve = 1024 * 1024;
 constexpr size_t reserve = 256 * 1024;
 #endif
 
+// What is used of a stack without a limit, as much as the command gives itself.
+constexpr size_t unlimitedUse = size_t{1} << 30;
+// No host reserves a stack of this size for a thread.
+constexpr size_t unlimitedSize = size_t{1} << 36;
+
 uintptr_t lowestUsableAddress() {
   pthread_attr_t attributes;
   void* base = nullptr;
@@ -27,11 +31,16 @@ uintptr_t lowestUsableAddress() {
     pthread_attr_getstack(&attributes, &base, &size);
     pthread_attr_destroy(&attributes);
   }
-  // A very small stack keeps half of itself usable.
-  return reinterpret_cast<uintptr_t>(base) + (size / 2 < reserve ? size / 2 : reserve);
+  return XQueryLowestStackAddress(reinterpret_cast<uintptr_t>(base), size);
 }
 
 }  // namespace
+
+uintptr_t XQueryLowestStackAddress(uintptr_t base, size_t size) {
+  if (size >= unlimitedSize) return base + size - unlimitedUse;
+  // A very small stack keeps half of itself usable.
+  return base + std::min(size / 2, reserve);
+}
 
 bool XQueryStackHasRoom() {
   WorkMeter& meter = workMeter;

@@ -5,6 +5,7 @@
 
 #include "Platform/WorkMeter.h"
 
+#include <cstddef>
 #include <cstdint>
 
 namespace xquery {
@@ -14,6 +15,11 @@ class XQueryProlog;
 
 // Whether enough stack is left to go one level deeper.
 bool XQueryStackHasRoom();
+
+// Down to which address a stack of that size, whose lowest address is the base, may grow. Of one
+// without a limit, such as a main thread's after "ulimit -s unlimited", not all is used: an endless
+// recursion would take all memory before it came to the end.
+uintptr_t XQueryLowestStackAddress(uintptr_t base, size_t size);
 
 // What XQueryCheckStack does when its two comparisons do not settle the matter.
 void XQueryCheckStackClosely(XQueryContext& context);
