@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <pthread.h>
+#include <sys/resource.h>
 
 namespace xquery {
 namespace {
@@ -23,14 +24,25 @@ constexpr size_t unlimitedUse = size_t{1} << 30;
 // No host reserves a stack of this size for a thread.
 constexpr size_t unlimitedSize = size_t{1} << 36;
 
+// Where the main thread's stack is the system library reads from a file of the kernel, which may
+// not be there or not be opened for want of a descriptor. Half of what the limit allows is then
+// taken to be left below this frame.
+uintptr_t guessedLowestAddress() {
+  constexpr rlim_t usualSize = rlim_t{8} << 20;
+  rlimit limit = {};
+  const bool isKnown = getrlimit(RLIMIT_STACK, &limit) == 0 && limit.rlim_cur != RLIM_INFINITY;
+  const uintptr_t address = XQueryStackAddress();
+  const uintptr_t room = (isKnown ? limit.rlim_cur : usualSize) / 2;
+  return room < address ? address - room : address;
+}
+
 uintptr_t lowestUsableAddress() {
   pthread_attr_t attributes;
+  if (pthread_getattr_np(pthread_self(), &attributes) != 0) return guessedLowestAddress();
   void* base = nullptr;
   size_t size = 0;
-  if (pthread_getattr_np(pthread_self(), &attributes) == 0) {
-    pthread_attr_getstack(&attributes, &base, &size);
-    pthread_attr_destroy(&attributes);
-  }
+  pthread_attr_getstack(&attributes, &base, &size);
+  pthread_attr_destroy(&attributes);
   return XQueryLowestStackAddress(reinterpret_cast<uintptr_t>(base), size);
 }
 

@@ -1,6 +1,11 @@
+#include "Eval/LimitsTestSupport.h"
 #include "Eval/StackGuard.h"
+#include "Platform/WorkMeter.h"
 
 #include <gtest/gtest.h>
+
+#include <cstdint>
+#include <sys/resource.h>
 
 namespace xquery {
 namespace {
@@ -28,6 +33,42 @@ TEST(StackGuard, OfASmallStackHalfIsUsed) {
 TEST(StackGuard, OfAStackWithoutALimitAGibibyteIsUsed) {
   EXPECT_EQ(usedOf(64 * gibibyte), gibibyte);
   EXPECT_EQ(usedOf(100000 * gibibyte), gibibyte);
+}
+
+// Sets a limit of the process for a while.
+class ProcessLimit {
+ public:
+  ProcessLimit(__rlimit_resource_t resource, rlim_t value) : _resource(resource) {
+    getrlimit(resource, &_former);
+    const rlimit limit = {value, _former.rlim_max};
+    EXPECT_EQ(setrlimit(resource, &limit), 0);
+  }
+  ~ProcessLimit() { setrlimit(_resource, &_former); }
+  ProcessLimit(const ProcessLimit&) = delete;
+  ProcessLimit& operator=(const ProcessLimit&) = delete;
+
+ private:
+  const __rlimit_resource_t _resource;
+  rlimit _former = {};
+};
+
+// What the system library opens to find the main thread's stack cannot be opened then.
+TEST(StackGuard, HoldsOnAMainThreadThatCannotOpenFiles) {
+  const ProcessLimit stack(RLIMIT_STACK, rlim_t{8} << 20);
+  const ProcessLimit files(RLIMIT_NOFILE, 0);
+  const auto context = XQueryContext::xqueryContext();
+  workMeter.stackLimit = UINTPTR_MAX;
+  EXPECT_EQ(limitstest::evaluate(*context,
+                                 "declare function local:f($n) { 1 + local:f($n) }; "
+                                 "local:f(0)")
+                .error,
+            "limit: expression nested too deeply");
+  EXPECT_EQ(limitstest::evaluate(*context,
+                                 "declare function local:f($n) { if ($n = 0) then 0 "
+                                 "else 1 + local:f($n - 1) }; local:f(1000)")
+                .result,
+            "1000");
+  workMeter.stackLimit = UINTPTR_MAX;
 }
 
 }  // namespace
