@@ -4,15 +4,19 @@
 // The stack of the main thread grows up to a limit that takes effect when a program starts, so the
 // limit is raised and the program started anew. A thread with a large stack would do without that,
 // but a process with two threads counts references and allocates with atomic steps: arithmetic over
-// a range took 1.7 times as long. It remains for where the limit cannot be raised.
+// a range took 1.7 times as long. It remains for where the limit cannot be raised, and for where
+// the address space is bounded: the room for a thread's stack is taken beforehand, whereas a main
+// thread that finds none when its stack grows is killed.
 #include "Options.h"
 #include "Run.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdio>
 #include <filesystem>
 #include <pthread.h>
 #include <signal.h>
+#include <sys/auxv.h>
 #include <sys/resource.h>
 #include <system_error>
 #include <unistd.h>
@@ -21,6 +25,12 @@ namespace {
 
 constexpr size_t stackSize = size_t{1} << 30;
 
+// How much address space the process may take; RLIM_INFINITY where it is not bounded.
+rlim_t addressSpace() {
+  rlimit space;
+  return getrlimit(RLIMIT_AS, &space) == 0 ? space.rlim_cur : RLIM_INFINITY;
+}
+
 bool hasLargeStack() {
   rlimit limit;
   return getrlimit(RLIMIT_STACK, &limit) == 0 && limit.rlim_cur != RLIM_INFINITY &&
@@ -28,16 +38,21 @@ bool hasLargeStack() {
 }
 
 // Comes back only when the program cannot be started with a large stack. It is never tried twice,
-// since a program that was started so finds the limit raised.
+// since a program that was started so finds the limit raised; emulators that only pretend to raise
+// it are not believed.
 void restartWithLargeStack(char** argv) {
+  // What was started as an argument of the dynamic loader finds the loader in /proc.
+  const bool isStartedByLoader = getauxval(AT_BASE) == 0;
   rlimit limit;
-  if (getrlimit(RLIMIT_STACK, &limit) != 0 || limit.rlim_max < stackSize) return;
+  if (isStartedByLoader || getrlimit(RLIMIT_STACK, &limit) != 0 || limit.rlim_max < stackSize) {
+    return;
+  }
   std::error_code error;
   const std::filesystem::path program = std::filesystem::read_symlink("/proc/self/exe", error);
   if (error) return;
   const rlim_t previous = limit.rlim_cur;
   limit.rlim_cur = stackSize;
-  if (setrlimit(RLIMIT_STACK, &limit) != 0) return;
+  if (setrlimit(RLIMIT_STACK, &limit) != 0 || !hasLargeStack()) return;
   execv(program.c_str(), argv);
   limit.rlim_cur = previous;
   setrlimit(RLIMIT_STACK, &limit);
@@ -54,10 +69,12 @@ void* runJob(void* argument) {
   return nullptr;
 }
 
-// Where so much address space is not to be had, half of it is tried, and so on.
+// Three quarters of a bounded address space are left for the rest. Where so much is not to be had,
+// half of it is tried, and so on.
 bool runOnThread(Job& job) {
   constexpr size_t smallest = size_t{1} << 20;
-  for (size_t size = stackSize; size >= smallest; size /= 2) {
+  const size_t most = std::min<rlim_t>(stackSize, addressSpace() / 4);
+  for (size_t size = most; size >= smallest; size /= 2) {
     pthread_attr_t attributes;
     pthread_t thread;
     pthread_attr_init(&attributes);
@@ -72,14 +89,15 @@ bool runOnThread(Job& job) {
 }  // namespace
 
 int main(int argc, char** argv) {
-  const bool large = hasLargeStack();
-  if (!large) restartWithLargeStack(argv);
+  const bool isBounded = addressSpace() != RLIM_INFINITY;
+  const bool usesMainStack = !isBounded && hasLargeStack();
+  if (!isBounded && !usesMainStack) restartWithLargeStack(argv);
   // A reader that goes away is a failed write like any other, to be reported and not to die of.
   signal(SIGPIPE, SIG_IGN);
   cli::Options options;
   if (const auto status = cli::parseOptions(argc, argv, options)) return *status;
   Job job{options};
-  if (large) {
+  if (usesMainStack) {
     runJob(&job);
   } else if (!runOnThread(job)) {
     std::fprintf(stderr, "xquery: cannot start a thread\n");

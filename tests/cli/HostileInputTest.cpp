@@ -4,6 +4,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <link.h>
+
 using command::Outcome;
 using command::TemporaryDirectory;
 using command::xquery;
@@ -72,7 +74,40 @@ TEST(HostileInput, EndlessRecursionIsAnError) {
   EXPECT_THAT(outcome.err, StartsWith("XQueryError:0"));
   EXPECT_THAT(outcome.err, HasSubstr("limit: expression nested too deeply"));
 }
+
+TEST(HostileInput, EndlessRecursionIsAnErrorWhereTheAddressSpaceIsBounded) {
+  for (const std::string kilobytes : {"300000", "1000000"}) {
+    const Outcome outcome =
+        command::start("/bin/sh", {"-c", "ulimit -v \"$2\" && exec \"$0\" -e \"$1\"",
+                                   XQUERY_BINARY_DIR "/xquery", recursion("-1"), kilobytes});
+    EXPECT_EQ(outcome.status, 1) << kilobytes;
+    EXPECT_THAT(outcome.err, HasSubstr("limit: expression nested too deeply")) << kilobytes;
+  }
+}
 #endif
+
+// The path of the dynamic loader that this program asks for.
+std::string dynamicLoader() {
+  std::string path;
+  dl_iterate_phdr(
+      [](dl_phdr_info* object, size_t, void* found) {
+        for (int i = 0; i < object->dlpi_phnum; ++i) {
+          if (object->dlpi_phdr[i].p_type != PT_INTERP) continue;
+          *static_cast<std::string*>(found) =
+              reinterpret_cast<const char*>(object->dlpi_addr + object->dlpi_phdr[i].p_vaddr);
+        }
+        return 1;  // the first object is the program
+      },
+      &path);
+  return path;
+}
+
+TEST(HostileInput, TheCommandMayBeStartedByTheDynamicLoader) {
+  const Outcome outcome =
+      command::start(dynamicLoader(), {XQUERY_BINARY_DIR "/xquery", "-e", recursion("1000")});
+  EXPECT_EQ(outcome.err, "");
+  EXPECT_EQ(outcome.out, "1000\n");
+}
 
 TEST(HostileInput, ADocumentAMillionElementsDeepCanBeSearched) {
   const TemporaryDirectory directory;
