@@ -1,9 +1,12 @@
 #include "Options.h"
 
+#include "Output.h"
+
 #include <CLI/CLI.hpp>
 
 #include <iostream>
 #include <memory>
+#include <sstream>
 
 namespace cli {
 namespace {
@@ -90,6 +93,18 @@ void interpret(const CLI::App& app, const RawOptions& raw, Options& options) {
   }
 }
 
+// Help and version are output like any other.
+Status print(const CLI::App& app, const CLI::Success& request) {
+  std::ostringstream text;
+  app.exit(request, text, text);
+  Output output;
+  if (output.open(std::nullopt) && output.append(text.str()) && output.finish()) {
+    return StatusResult;
+  }
+  std::cerr << "xquery: cannot write standard output: " << output.error() << '\n';
+  return StatusInput;
+}
+
 }  // namespace
 
 std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
@@ -100,8 +115,7 @@ std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
     app.parse(argc, argv);
     interpret(app, raw, options);
   } catch (const CLI::Success& success) {
-    app.exit(success, std::cout, std::cerr);
-    return StatusResult;
+    return print(app, success);
   } catch (const CLI::ParseError& error) {
     std::cerr << "xquery: " << error.what() << "\nTry xquery --help.\n";
     return StatusUsage;

@@ -7,8 +7,7 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
-#include <fstream>
-#include <iterator>
+#include <memory>
 #include <string_view>
 
 namespace cli {
@@ -28,12 +27,21 @@ struct Stop {
   throw Stop{status};
 }
 
+struct CloseFile {
+  void operator()(std::FILE* file) const { std::fclose(file); }
+};
+
 std::string readFile(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
+  const std::unique_ptr<std::FILE, CloseFile> file(std::fopen(path.c_str(), "rb"));
   std::string text;
-  if (file) text.assign(std::istreambuf_iterator<char>(file), {});
+  char piece[65536];
+  while (const size_t count = file ? std::fread(piece, 1, sizeof piece, file.get()) : 0) {
+    text.append(piece, count);
+  }
   // A directory opens but cannot be read.
-  if (!file || file.bad()) stop(StatusInput, "xquery: " + path + ": " + std::strerror(errno));
+  if (!file || std::ferror(file.get())) {
+    stop(StatusInput, "xquery: " + path + ": " + std::strerror(errno));
+  }
   return text;
 }
 
@@ -62,7 +70,11 @@ Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path,
   Ref<NSXMLDocument> document = NSXMLDocument::documentWithFile(path, mode, &error);
   if (document) return document;
   const std::string name = path == "-" ? "standard input" : path;
-  if (error.line == 0) stop(StatusInput, "xquery: " + name + ": " + error.message);
+  if (error.line == 0) {
+    // The reason why a file cannot be read begins with its path.
+    const size_t named = error.message.starts_with(path + ": ") ? path.size() + 2 : 0;
+    stop(StatusInput, "xquery: " + name + ": " + error.message.substr(named));
+  }
   stop(StatusInput, name + ":" + std::to_string(error.line) + ":" + std::to_string(error.column) +
                         ": " + error.message);
 }

@@ -37,6 +37,17 @@ int closedPipe() {
   return ends[1];
 }
 
+int openOutput(StandardOutput kind, const std::string& captured) {
+  switch (kind) {
+    case StandardOutput::ClosedPipe:
+      return closedPipe();
+    case StandardOutput::FullDevice:
+      return openFile("/dev/full", O_WRONLY);
+    default:
+      return openFile(captured, O_WRONLY | O_CREAT);
+  }
+}
+
 }  // namespace
 
 Outcome start(const std::string& program, const std::vector<std::string>& arguments,
@@ -44,9 +55,7 @@ Outcome start(const std::string& program, const std::vector<std::string>& argume
   const TemporaryDirectory directory;
   const std::string out = directory.path("out"), err = directory.path("err");
   const int inFile = openFile(directory.write("in", input), O_RDONLY);
-  const int outFile = standardOutput == StandardOutput::ClosedPipe
-                          ? closedPipe()
-                          : openFile(out, O_WRONLY | O_CREAT);
+  const int outFile = openOutput(standardOutput, out);
   const int errFile = openFile(err, O_WRONLY | O_CREAT);
   const pid_t child = fork();
   if (child == 0) {

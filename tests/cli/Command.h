@@ -13,7 +13,7 @@ struct Outcome {
   std::string err;
 };
 
-enum class StandardOutput { Captured, ClosedPipe };
+enum class StandardOutput { Captured, ClosedPipe, FullDevice };
 
 // Starts a program, of the build directory when its name has no slash, with `input` as its standard
 // input.
