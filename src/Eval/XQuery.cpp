@@ -125,9 +125,10 @@ void decorateWithBaseURI(const NSArray& items, const XQueryContextInternal& cont
 
 // Other errors leave the variables and the focus as they were when they arose. A limit may have
 // been reached because of what those hold.
-void dropValues(XQueryContextInternal& context, const Value& formerContextItem) {
+void dropValues(XQueryContextInternal& context, const Value& formerContextItem,
+                int64_t formerPosition) {
   context._setInScopeVariables(nullptr);
-  context.setContextItem(formerContextItem, 1);
+  context.setContextItem(formerContextItem, formerPosition);
 }
 
 }  // namespace
@@ -156,6 +157,7 @@ Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
                                     const XQueryConstants& constants) {
   XQueryLimitWatch watch(*this);
   const Value contextItem = _private->contextItem();
+  const int64_t position = _private->position();
   try {
     // A limit that is reached already ends the shortest evaluation as well.
     watch.lookAtWork();
@@ -166,10 +168,10 @@ Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
     watch.lookAtWork();
     return result;
   } catch (const NSException&) {
-    if (XQueryIsLimit(_private->error().get())) dropValues(*_private, contextItem);
+    if (XQueryIsLimit(_private->error().get())) dropValues(*_private, contextItem, position);
     return _private->error();
   } catch (const std::bad_alloc&) {
-    dropValues(*_private, contextItem);
+    dropValues(*_private, contextItem, position);
     return watch.allocationFailure().error();
   } catch (const std::length_error&) {
     // Only decimals throw it.

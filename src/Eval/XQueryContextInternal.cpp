@@ -14,9 +14,13 @@
 
 namespace xquery {
 
+// A query may give an error of its own any namespace to begin with, but not a text without the
+// number sign after it.
 bool XQueryIsLimit(const XQueryError* error) {
-  return error && error->err() == 0 && error->msg() &&
-         error->msg()->view().startsWith(NSStringView::ascii("limit: "));
+  if (!error || error->err() != 0 || !error->msg()) return false;
+  const NSStringView text = error->msg()->view();
+  return text.startsWith(NSStringView::ascii("limit: ")) &&
+         text.find(u'#') == NSStringView::notFound;
 }
 
 namespace {

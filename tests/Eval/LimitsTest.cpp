@@ -5,6 +5,7 @@
 // does not lengthen, except where it waits for others. An evaluation that ends by itself before it
 // is told to fails its test, since it gives no error.
 #include "Eval/LimitsTestSupport.h"
+#include "Eval/XQueryContextInternal.h"
 #include "Platform/HTTPServer.h"
 #include "Platform/LoadingTestSupport.h"
 #include "Platform/WorkMeter.h"
@@ -417,6 +418,23 @@ TEST(Limits, NobodyPassesOverTheirErrors) {
   limits.duration = milliseconds(20);
   EXPECT_EQ(underLimits(limits, "(1, 2)[" + endless + "]").error, deadlinePassed);
   EXPECT_EQ(underLimits(limits, endless + " castable as xs:date").error, deadlinePassed);
+}
+
+TEST(Limits, AnErrorOfTheQueryIsNoneHoweverItBegins) {
+  const std::string error =
+      "declare namespace p = 'limit: '; count((1, 2)[error(xs:QName('p:x'), 'limit: y')])";
+  EXPECT_EQ(underLimits({}, error).result, "0");
+}
+
+TEST(Limits, LeaveTheFocusAsItWasBefore) {
+  const auto context = XQueryContext::xqueryContext();
+  context->_internal().setContextItem(XQueryUntypedAtomic("kept"), 3);
+  XQueryLimits limits;
+  limits.duration = milliseconds(20);
+  context->contextSetLimits(limits);
+  EXPECT_EQ(evaluate(*context, "(1 to 20000000)[position() < 0]").error, deadlinePassed);
+  context->contextSetLimits({});
+  EXPECT_EQ(evaluate(*context, "., position()").result, "kept 3");
 }
 
 TEST(Limits, TheirErrorsHaveNumberZeroAndNoLine) {
