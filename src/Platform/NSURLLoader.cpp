@@ -88,9 +88,12 @@ bool NSURLLoader::mayFollow(const std::string& redirectURL) {
 
 std::optional<XQueryResource> NSURLLoader::loadFromServer(const NSURL& URL) {
   using Clock = std::chrono::steady_clock;
+  using std::chrono::milliseconds;
   const XQueryLoadingLimits& limits = _loading.limits;
-  const auto end = Clock::now() + limits.totalTimeout;
-  CurlRequest request = {URL.absoluteString()->utf8(), limits.connectTimeout, limits.totalTimeout,
+  // The end of a very long time is beyond what the clock counts, so what is left is counted.
+  const milliseconds total = std::max(limits.totalTimeout, milliseconds::zero());
+  const auto start = Clock::now();
+  CurlRequest request = {URL.absoluteString()->utf8(), limits.connectTimeout, total,
                          limits.mostBytes, _checkpoint};
   for (int redirects = 0;; ++redirects) {
     auto response = fetchWithCurl(request, _failure);
@@ -108,9 +111,8 @@ std::optional<XQueryResource> NSURLLoader::loadFromServer(const NSURL& URL) {
       return std::nullopt;
     }
     request.URL = std::move(response->redirectURL);
-    request.totalTimeout =
-        std::chrono::duration_cast<std::chrono::milliseconds>(end - Clock::now());
-    if (request.totalTimeout <= request.totalTimeout.zero()) {
+    request.totalTimeout = total - std::chrono::duration_cast<milliseconds>(Clock::now() - start);
+    if (request.totalTimeout <= milliseconds::zero()) {
       _failure = "the time is up";
       return std::nullopt;
     }

@@ -265,6 +265,23 @@ TEST_F(Server, TheTimeIsThatOfAllRedirectsTogether) {
   EXPECT_LT(Clock::now() - start, notForEver);
 }
 
+TEST_F(Server, TheLongestTimesAreNoLimit) {
+  loading.limits.connectTimeout = loading.limits.totalTimeout = milliseconds::max();
+  server.redirect("/a", "/b");
+  server.answer("/b", "text/plain", "x");
+  EXPECT_EQ(failure("/a"), "none");
+}
+
+TEST_F(Server, WithoutTimeARedirectIsNotFollowed) {
+  server.redirect("/a", "/b");
+  server.answer("/b", "text/plain", "x");
+  for (const milliseconds time : {milliseconds(0), milliseconds(-1), milliseconds::min()}) {
+    loading.limits.totalTimeout = time;
+    EXPECT_NE(failure("/a"), "none");
+  }
+  EXPECT_EQ(server.requests("/b"), 0);
+}
+
 TEST_F(Server, ABodyThatBreaksOffIsNothing) {
   server.handle("/a", [](HTTPServer::Connection& connection) {
     connection.send("HTTP/1.1 200 Fine\r\nContent-Length: 100\r\nConnection: close\r\n\r\n<a/>");
