@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # Installs what is missing, builds, and runs every test. XQUERY_PRESET chooses another build
-# (release, debug, asan); XQUERY_WERROR=ON turns warnings into errors.
+# (release, debug, asan, tsan); XQUERY_WERROR=ON turns warnings into errors.
 set -u
 . "$(dirname "${BASH_SOURCE[0]}")/cmake/prepare.sh"
 

@@ -25,10 +25,10 @@ need_packages() {
 
 # quietly COMMAND...: shows the output only when the command fails.
 quietly() {
-  local log status
+  local log status=0
   log=$(mktemp)
-  "$@" >"$log" 2>&1
-  status=$?
+  # A failure must not end a shell that ends at failures before it is shown.
+  "$@" >"$log" 2>&1 || status=$?
   [ $status -eq 0 ] || cat "$log" >&2
   rm -f "$log"
   return $status
