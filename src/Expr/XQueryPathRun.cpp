@@ -2,6 +2,7 @@
 
 #include "Eval/XQueryContextInternal.h"
 #include "Expr/XQueryPath.h"
+#include "Platform/XMLTree.h"
 
 namespace xquery {
 namespace {
@@ -32,6 +33,16 @@ const NSXMLExpandedName* XQueryPathRun::nameForDeferredTest(const XQueryNameTest
   _deferredNames.emplace_back(&test,
                               qName ? XQueryNameTest::interned(*qName) : NSXMLExpandedNameRef());
   return _deferredNames.back().second.get();
+}
+
+XQueryAxisTrail& XQueryPathRun::trail(size_t index) {
+  if (_trails.empty()) _trails.resize(trailCount);
+  Trail& found = _trails[index];
+  if (found.linkCount != NSXMLTree::linkCount()) {
+    found.trail = XQueryAxisTrail();
+    found.linkCount = NSXMLTree::linkCount();
+  }
+  return found.trail;
 }
 
 XQueryNodeTest::XQueryNodeTest(const XQueryExpr* expr, XQueryPathRun& run)

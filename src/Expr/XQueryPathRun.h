@@ -34,10 +34,9 @@ class XQueryPathRun {
 
   // How many steps of the path keep trails.
   size_t trailCount = 0;
-  XQueryAxisTrail& trail(size_t index) {
-    if (_trails.empty()) _trails.resize(trailCount);
-    return _trails[index];
-  }
+  // A trail begins anew where a predicate of an earlier step has constructed something since it was
+  // last asked for, since that may have given the nodes a parent.
+  XQueryAxisTrail& trail(size_t index);
 
   bool contextHasDefaultNamespace();
   // The interned name of a deferred test; resolved once (which may raise) and kept while the path
@@ -59,7 +58,11 @@ class XQueryPathRun {
 
   std::vector<std::pair<const XQueryNameTest*, NSXMLExpandedNameRef>> _deferredNames;
   std::deque<std::vector<NSXMLNode*>> _nodeLists;
-  std::vector<XQueryAxisTrail> _trails;
+  struct Trail {
+    XQueryAxisTrail trail;
+    uint64_t linkCount = 0;  // NSXMLTree::linkCount at its last use
+  };
+  std::vector<Trail> _trails;
   size_t _openNodeLists = 0;
   DefaultNamespace _defaultNamespace = DefaultNamespace::Unknown;
 };

@@ -398,7 +398,18 @@ void NSXMLTree::absorb(NSXMLTree* smaller) {
 
 // --- structure -------------------------------------------------------------------------------
 
+namespace {
+
+constinit thread_local uint64_t linkedNodes __attribute__((tls_model("initial-exec"))) = 0;
+
+}  // namespace
+
+uint64_t NSXMLTree::linkCount() {
+  return linkedNodes;
+}
+
 void NSXMLTree::noteChange(const NSXMLNode* parent) {
+  ++linkedNodes;
   NSXMLTree* tree = of(parent);
   if (tree->order == Fresh) {
     tree->order = Stale;

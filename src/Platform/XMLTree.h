@@ -143,6 +143,9 @@ class NSXMLTree : public NSXMLTreeHead {
   // For an element's many attributes in turn: `last` is its last one, null for none.
   static void appendAttribute(NSXMLElement* element, NSXMLNode* attribute, NSXMLNode* last);
   static void detach(NSXMLNode* node);
+  // How many nodes the calling thread has linked so far: as long as it links none, what is around
+  // the nodes of its evaluation stays as it is.
+  static uint64_t linkCount();
   // For builders: the fields of a node, as they are.
   static NSXMLNode*& parentOf(NSXMLNode* node) { return node->_parent; }
   static NSXMLNode*& nextOf(NSXMLNode* node) { return node->_next; }
