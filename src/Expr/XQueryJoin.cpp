@@ -4,9 +4,11 @@
 #include "Expr/XQueryClauseItems.h"
 #include "Expr/XQueryFLWOR.h"
 #include "Expr/XQueryJoinMemo.h"
+#include "Expr/XQueryOperatorExpr.h"
 #include "Expr/XQueryPath.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/NSLog.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "xquery/Number.h"
 
@@ -42,14 +44,24 @@ Value valueOrNull(const XQueryExpr& expr, XQueryContext& context) {
 // Whether all nodes of the value belong to documents. They stay where they are, while a constructor
 // gives a parent to a node that has none.
 bool isInDocuments(const NSObject* value) {
-  constexpr size_t mostItems = 64;
   const XQueryItemList list(value);
-  if (list.count() > mostItems) return false;
+  WorkPacer pacer;
   for (size_t i = 0; i < list.count(); ++i) {
+    pacer.turn();
     const auto* node = dyn_cast<NSXMLNode>(list[i]);
     if (node && !node->rootDocument()) return false;
   }
   return true;
+}
+bool areInDocuments(std::span<const Value> values) {
+  return std::all_of(values.begin(), values.end(),
+                     [](const Value& value) { return isInDocuments(value.get()); });
+}
+
+// The same where it has to be known for every round.
+bool isBrieflyInDocuments(const NSObject* value) {
+  constexpr size_t mostItems = 4096;
+  return XQueryItemList(value).count() <= mostItems && isInDocuments(value);
 }
 
 // Whether what probe and guards find outside their nodes is the same for the whole round, whatever
@@ -58,11 +70,10 @@ bool staysInRound(const XQueryJoinCondition& condition, XQueryContext& context) 
   const auto& dynamic = context._internal();
   return std::all_of(
       condition.outward.begin(), condition.outward.end(), [&](const XQueryReads& reads) {
-        if (reads.globals || (reads.focus && !isInDocuments(dynamic.contextItem().get()))) {
-          return false;
-        }
+        if (reads.globals) return false;
+        if (reads.focus && !isBrieflyInDocuments(dynamic.contextItem().get())) return false;
         return std::all_of(reads.variables.begin(), reads.variables.end(), [&](int64_t varID) {
-          return isInDocuments(dynamic.variableForID(varID));
+          return isBrieflyInDocuments(dynamic.variableForID(varID));
         });
       });
 }
@@ -97,6 +108,7 @@ std::shared_ptr<XQueryJoinTable> selectFromMemo(const XQueryExpr& owner,
       return nullptr;
     case XQueryJoinMemo::Use::Second:
       table = makeTable();
+      if (table && !table->isComplete()) table = nullptr;
       context._internal().joinMemo().keep(owner, table);
       break;
     case XQueryJoinMemo::Use::Further:
@@ -128,15 +140,16 @@ std::unique_ptr<const XQueryForJoin> XQueryForJoin::joinOf(const XQueryForExpr& 
     const bool readsItem = read.readsVariable(clause.varID());
     const bool readsPosition = clause.posVarID() && read.readsVariable(clause.posVarID());
     if (!readsItem && !readsPosition) return XQueryJoinReads::Round;
-    const bool readsMore =
-        read.variables.size() > 1 || read.focus || read.outside || read.globals || readsPosition;
+    const bool readsMore = read.variables.size() > 1 || read.focus || read.globals || readsPosition;
     return readsMore ? XQueryJoinReads::Unknown : XQueryJoinReads::Item;
   };
   auto condition = XQueryJoinCondition::in(where, false, reads);
   if (!condition.key) return nullptr;
+  // The integers of a range have no keys that a table could keep.
+  if (XQueryOperatorExpr::rangeIn(clause.expr())) return nullptr;
   XQueryReads itemReads = XQueryReadsOf(*clause.expr());
-  const bool isSettled =
-      itemReads.isRepeatable && !itemReads.outside && itemReads.variables.size() <= mostVariables;
+  const bool isSettled = itemReads.isRepeatable && !(itemReads.outside && itemReads.globals) &&
+                         itemReads.variables.size() <= mostVariables;
   if (!isSettled) return nullptr;
   return std::unique_ptr<const XQueryForJoin>(
       new XQueryForJoin(clause, std::move(condition), std::move(itemReads)));
@@ -153,8 +166,10 @@ std::shared_ptr<XQueryJoinTable> XQueryForJoin::select(
   for (const int64_t varID : _itemReads.variables) {
     dependencies[count++] = dynamic.variableForID(varID);
   }
-  return selectFromMemo(owner, {dependencies.data(), count}, _condition, context, selection,
-                        [&] { return makeTable(context); });
+  const std::span<const Value> known(dependencies.data(), count);
+  return selectFromMemo(owner, known, _condition, context, selection, [&] {
+    return _itemReads.outside && !areInDocuments(known) ? nullptr : makeTable(context);
+  });
 }
 
 std::shared_ptr<XQueryJoinTable> XQueryForJoin::makeTable(XQueryContext& context) const {
@@ -171,7 +186,9 @@ std::shared_ptr<XQueryJoinTable> XQueryForJoin::makeTable(XQueryContext& context
     if (!keepsIdentity && !list[i]->isNode()) return nullptr;
     items.emplace_back(list[i]);
   }
-  if (!isWorthATable(items)) return nullptr;
+  if (!isWorthATable(items) || (_condition.looksOutOfItems && !areInDocuments(items))) {
+    return nullptr;
+  }
   const auto keyOf = [&](size_t position) {
     context._internal().setVariable(items[position], _clause.varID());
     switch (answerOf(_condition.filters, context)) {
@@ -193,7 +210,7 @@ std::unique_ptr<const XQueryPathJoin> XQueryPathJoin::joinOf(const XQueryStep* f
     const XQueryReads read = XQueryReadsOf(expr);
     if (!read.isRepeatable) return XQueryJoinReads::Unknown;
     if (!read.focus) return XQueryJoinReads::Round;
-    const bool readsMore = read.outside || read.globals || !read.variables.empty();
+    const bool readsMore = read.globals || !read.variables.empty();
     return readsMore ? XQueryJoinReads::Unknown : XQueryJoinReads::Item;
   };
   const XQueryStep* firstAxisStep = isa<XQueryAxisStep>(firstStep) ? firstStep : nullptr;
@@ -205,15 +222,19 @@ std::unique_ptr<const XQueryPathJoin> XQueryPathJoin::joinOf(const XQueryStep* f
     if (step->predicates().size() != 1) continue;
     auto condition = XQueryJoinCondition::in(step->predicates().front().get(), true, itemReads);
     if (!condition.key) continue;
+    bool looksOut = false;
     if (axisStep) {
       if (step->next() && !isa<XQueryAxisStep>(step->next())) return nullptr;
       // All of the nodes are filtered before the next step sees one, and as if by their own.
       if (!XQueryIsRepeatable(*step->predicates().front())) return nullptr;
       const XQueryReads reads = XQueryReadsOfSteps(*firstAxisStep, *step);
-      const bool isSettled = reads.isRepeatable && !reads.outside && reads.variables.empty();
+      const bool isSettled =
+          reads.isRepeatable && !(reads.outside && reads.globals) && reads.variables.empty();
       if (!isSettled) return nullptr;
+      looksOut = reads.outside;
     }
-    return std::unique_ptr<const XQueryPathJoin>(new XQueryPathJoin(*step, std::move(condition)));
+    return std::unique_ptr<const XQueryPathJoin>(
+        new XQueryPathJoin(*step, std::move(condition), looksOut));
   }
   return nullptr;
 }
@@ -223,8 +244,10 @@ std::shared_ptr<XQueryJoinTable> XQueryPathJoin::select(
     XQueryContext& context, XQueryJoinTable::Selection& selection) const {
   if (looksAway(owner, context)) return nullptr;
   const auto makeTable = [&]() -> std::shared_ptr<XQueryJoinTable> {
+    if (_looksOutOfStart && !isInDocuments(start.get())) return nullptr;
     std::vector<Value> items;
     if (!listItems(items) || !isWorthATable(items)) return nullptr;
+    if (_condition.looksOutOfItems && !areInDocuments(items)) return nullptr;
     auto& dynamic = context._internal();
     const Value item = dynamic.contextItem();
     const int64_t position = dynamic.position();

@@ -4,11 +4,11 @@
 // a join of two lists take as many comparisons as there are pairs.
 //
 // Nobody can tell the difference. Key, probe and items are repeatable expressions (XQueryReads.h),
-// so how often they are evaluated does not matter; the items' keys lie inside the items, where
-// nothing changes while a query is evaluated; an item whose comparison may be an error is compared
-// the plain way when its turn comes; and where the probe itself fails, or anything else is unusual,
-// the whole round is done the plain way. With diagnostics on, when evaluating writes to the log,
-// there are no joins.
+// so how often they are evaluated does not matter; items and keys are found where nothing changes
+// while a query is evaluated, which is inside a node and, for nodes of documents, around it; an
+// item whose comparison may be an error is compared the plain way when its turn comes; and where
+// the probe itself fails, or anything else is unusual, the whole round is done the plain way. With
+// diagnostics on, when evaluating writes to the log, there are no joins.
 #pragma once
 
 #include "Expr/XQueryJoinCondition.h"
@@ -68,11 +68,12 @@ class XQueryPathJoin {
   }
 
  private:
-  XQueryPathJoin(const XQueryStep& step, XQueryJoinCondition condition)
-      : _step(step), _condition(std::move(condition)) {}
+  XQueryPathJoin(const XQueryStep& step, XQueryJoinCondition condition, bool looksOutOfStart)
+      : _step(step), _condition(std::move(condition)), _looksOutOfStart(looksOutOfStart) {}
 
   const XQueryStep& _step;
   XQueryJoinCondition _condition;
+  bool _looksOutOfStart;  // to find the items
 };
 
 }  // namespace xquery

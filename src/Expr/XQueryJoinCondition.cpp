@@ -3,6 +3,7 @@
 #include "Expr/XQueryLists.h"
 #include "Expr/XQueryOperatorExpr.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <optional>
 #include <utility>
@@ -125,21 +126,28 @@ XQueryJoinCondition XQueryJoinCondition::in(const XQueryExpr* condition, bool er
       best.filters = filters;
       best.guards = guards;
     }
-    if (errorExcludes && parts.loads) break;
-    if (errorExcludes) continue;
+    if (errorExcludes) {
+      const bool shows = parts.loads || (parts.failsInPath && !XQueryIsRepeatable(*condition));
+      if (shows) break;
+      continue;
+    }
     const XQueryJoinReads read = reads(*conjunct);
     if (read == XQueryJoinReads::Unknown) break;
     (read == XQueryJoinReads::Item ? filters : guards).push_back(conjunct);
   }
-  if (!best.key) return best;
-  best.addOutward(*best.probe);
-  for (const XQueryExpr* guard : best.guards) best.addOutward(*guard);
+  if (best.key) best.noteOutward();
   return best;
 }
 
-void XQueryJoinCondition::addOutward(const XQueryExpr& expr) {
-  XQueryReads reads = XQueryReadsOf(expr);
-  if (reads.outside) outward.push_back(std::move(reads));
+void XQueryJoinCondition::noteOutward() {
+  const auto looksOut = [](const XQueryExpr* expr) { return XQueryReadsOf(*expr).outside; };
+  looksOutOfItems = looksOut(key) || std::any_of(filters.begin(), filters.end(), looksOut);
+  const auto note = [this](const XQueryExpr* expr) {
+    XQueryReads reads = XQueryReadsOf(*expr);
+    if (reads.outside) outward.push_back(std::move(reads));
+  };
+  note(probe);
+  std::for_each(guards.begin(), guards.end(), note);
 }
 
 }  // namespace xquery

@@ -13,7 +13,7 @@ namespace xquery {
 
 // What an expression reads while items are picked.
 enum class XQueryJoinReads : uint8_t {
-  Item,     // the item, whose inside does not change, and nothing else
+  Item,     // the item and nothing else
   Round,    // anything but the item
   Unknown,  // both, or it is not repeatable
 };
@@ -30,18 +30,21 @@ struct XQueryJoinCondition {
   // those that do not read it.
   std::vector<const XQueryExpr*> filters;
   std::vector<const XQueryExpr*> guards;
+  // Key and filters look outside the item.
+  bool looksOutOfItems = false;
   // What those of the probe and the guards read that look outside the nodes they start from.
   std::vector<XQueryReads> outward;
 
   using Reads = std::function<XQueryJoinReads(const XQueryExpr&)>;
   // Of several comparisons joined by "and" the one that promises to exclude most. An item that it
   // excludes is excluded by the whole condition: where an error excludes as well (`errorExcludes`)
-  // because what stands before it is repeatable, and otherwise because only filters and guards do.
+  // because what stands before it is repeatable and what stands behind it cannot tell whether there
+  // was an error, and otherwise because only filters and guards stand before it.
   static XQueryJoinCondition in(const XQueryExpr* condition, bool errorExcludes,
                                 const Reads& reads);
 
  private:
-  void addOutward(const XQueryExpr& expr);
+  void noteOutward();
 };
 
 }  // namespace xquery

@@ -126,15 +126,33 @@ XQueryJoinTable::XQueryJoinTable(const XQueryJoinCondition& condition, std::vect
     : _relation(condition.relation),
       _isValueComparison(condition.isValueComparison),
       _items(std::move(items)) {
-  for (size_t index = 0; index < _items.size(); ++index) {
-    checkWork();
-    read(static_cast<uint32_t>(index), keyOf(index));
-  }
+  readKeys(keyOf);
   countMemory();
 }
 
 XQueryJoinTable::~XQueryJoinTable() {
   uncountValueBytes(static_cast<size_t>(_countedBytes));
+}
+
+void XQueryJoinTable::readKeys(const KeyReader& keyOf) {
+  const int64_t bytesBefore = workMeter.valueBytes;
+  for (size_t index = 0; index < _items.size() && _isComplete; ++index) {
+    checkWork();
+    read(static_cast<uint32_t>(index), keyOf(index));
+    _isComplete = !isTooLarge(bytesBefore);
+  }
+}
+
+// `bytesBefore`: what all values took before the first key was read.
+bool XQueryJoinTable::isTooLarge(int64_t bytesBefore) const {
+  if (_keys.size() > std::max(keysOfAnyItems, _items.size() * mostKeysPerItem)) return true;
+  // With both ways of finding it.
+  constexpr size_t bytesPerKey = sizeof(Operand) + sizeof(Value) + sizeof(NSStringView) +
+                                 sizeof(double) + 12 * sizeof(uint32_t);
+  constexpr int64_t part = 4;
+  const auto own = static_cast<int64_t>(_items.size() * sizeof(Value) + _keys.size() * bytesPerKey);
+  const int64_t keyBytes = workMeter.valueBytes - bytesBefore;
+  return own + keyBytes > workMeter.mostValueBytes / part - bytesBefore / part;
 }
 
 void XQueryJoinTable::read(uint32_t position, const Value& value) {

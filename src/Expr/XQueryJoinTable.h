@@ -39,6 +39,10 @@ class XQueryJoinTable {
   // A table for fewer items costs more than it saves.
   static constexpr size_t fewestItems = 8;
   static constexpr size_t mostItems = UINT32_MAX / 4;
+  // Keys by the thousand in every item, as "preceding::a" has them, would fill the memory that the
+  // plain way does not need. So many are taken however few the items are.
+  static constexpr size_t mostKeysPerItem = 32;
+  static constexpr size_t keysOfAnyItems = size_t{1} << 18;
 
   // The positions count the items, which the table keeps alive.
   XQueryJoinTable(const XQueryJoinCondition& condition, std::vector<Value> items,
@@ -47,6 +51,9 @@ class XQueryJoinTable {
   XQueryJoinTable& operator=(const XQueryJoinTable&) = delete;
   ~XQueryJoinTable();
 
+  // Whether it holds all keys. It does not when they are too many, or would take too much of the
+  // memory that is left to the evaluation; such a table must not be asked.
+  bool isComplete() const { return _isComplete; }
   const std::vector<Value>& items() const { return _items; }
 
   // Puts the items that meet the comparison with the probe, and those that have to be asked, into
@@ -87,7 +94,9 @@ class XQueryJoinTable {
     std::vector<uint32_t> _next;
   };
 
+  void readKeys(const KeyReader& keyOf);
   void read(uint32_t position, const Value& value);
+  bool isTooLarge(int64_t bytesBefore) const;
   bool takes(const Operands& keys);
   bool comparesAsNumbers(const Operands& probes) const;
   void scanTexts();
@@ -100,6 +109,7 @@ class XQueryJoinTable {
 
   const XQueryRelation _relation;
   const bool _isValueComparison;
+  bool _isComplete = true;
   bool _holdsTexts = false;    // the keys are untyped or texts ...
   bool _holdsNumbers = false;  // ... or numbers; neither while there is no key
   bool _hasDecimals = false;

@@ -25,7 +25,7 @@ class Reader {
   // The steps up to `end`, of which only the test counts; to the last one when it is null.
   void addSteps(const XQueryStep* first, const XQueryStep* end, bool hasOuterFocus) {
     for (const XQueryStep* step = first; step; step = step->next()) {
-      addStep(*step, hasOuterFocus && step == first, step != end);
+      addStep(*step, step == first, hasOuterFocus && step == first, step != end);
       if (step == end || _waiting.size() > mostExpressions) return;
     }
   }
@@ -45,10 +45,13 @@ class Reader {
     bool hasOuterFocus;
   };
 
-  void addStep(const XQueryStep& step, bool hasOuterFocus, bool withPredicates) {
+  void addStep(const XQueryStep& step, bool isFirst, bool hasOuterFocus, bool withPredicates) {
     if (const auto* axisStep = dyn_cast<XQueryAxisStep>(&step)) {
       if (hasOuterFocus) _reads.focus = true;
       if (!staysInside(axisStep->axis())) _reads.outside = true;
+      if (axisStep->testMayRaise()) _reads.failsInPath = true;
+    } else if (!isFirst || !step.predicates().empty()) {
+      _reads.failsInPath = true;
     }
     add(step.expr(), hasOuterFocus);
     if (!withPredicates) return;
@@ -58,8 +61,6 @@ class Reader {
   static bool staysInside(int axis) {
     switch (axis) {
       case XQueryAxisChild:
-      case XQueryAxisDescendant:
-      case XQueryAxisDescendantOrSelf:
       case XQueryAxisAttribute:
       case XQueryAxisSelf:
         return true;
@@ -89,8 +90,12 @@ class Reader {
       case Kind::Variable:
         readVariable(cast<XQueryVariable>(part.expr)->varID());
         return true;
-      case Kind::ContextItemExpr:
       case Kind::RootStepExpr:
+        // The document above stays. Without one it is an error, from which a predicate goes on.
+        _reads.outside = _reads.outside || !outer;
+        _reads.focus = _reads.focus || outer;
+        return true;
+      case Kind::ContextItemExpr:
         _reads.focus = _reads.focus || outer;
         return true;
       case Kind::Literal:

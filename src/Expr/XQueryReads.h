@@ -20,9 +20,14 @@ struct XQueryReads {
   // The context item.
   bool focus = false;
   // What lies outside the subtrees of the nodes it starts from: an element that a constructor
-  // made gets a parent later, so this may change, while what is inside a node never does.
+  // made gets a parent later, so this may change, while what is inside a node never does, nor what
+  // is around a node of a document. The descendant axes may look out, since they go on to the end
+  // of the document from a last child of a last child.
   bool outside = false;
   bool globals = false;
+  // An error may come up behind the first step of a path, which leaves another size in the focus
+  // than there was before.
+  bool failsInPath = false;
   // A document may be fetched, once for the whole evaluation.
   bool loads = false;
   // IDs of local variables, each once.

@@ -1,0 +1,98 @@
+#include "Expr/XQueryJoinTable.h"
+#include "Functions/FunctionsTesting.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+using functiontest::boolean;
+using functiontest::empty;
+using functiontest::integer;
+using functiontest::nan;
+using functiontest::number;
+using functiontest::sequence;
+using functiontest::string;
+using functiontest::untyped;
+
+XQueryJoinCondition condition(XQueryRelation::Test test, bool negated = false,
+                              bool isValueComparison = false) {
+  XQueryJoinCondition made;
+  made.relation = {test, negated};
+  made.isValueComparison = isValueComparison;
+  return made;
+}
+
+// The positions that a table of the keys selects, those that have to be asked with a "?"; "plain"
+// for the plain way. A null key stands for one that cannot be read.
+std::string selected(const XQueryJoinCondition& by, const std::vector<Value>& keys,
+                     const Value& probe) {
+  XQueryJoinTable table(by, keys, [&](size_t position) { return keys[position]; });
+  XQueryJoinTable::Selection selection;
+  if (!table.select(probe, selection)) return "plain";
+  std::string text;
+  for (const auto& match : selection) {
+    text += (text.empty() ? "" : " ") + std::to_string(match.position) + (match.isSure ? "" : "?");
+  }
+  return text;
+}
+
+constexpr auto equal = XQueryRelation::Equal;
+constexpr auto less = XQueryRelation::Less;
+
+TEST(JoinTable, TextsMeetEqualTexts) {
+  const std::vector<Value> keys = {untyped("a"), string("b"), untyped("b"), untyped("")};
+  EXPECT_EQ(selected(condition(equal), keys, untyped("b")), "1 2");
+  EXPECT_EQ(selected(condition(equal), keys, sequence({string("a"), string("b")})), "0 1 2");
+  EXPECT_EQ(selected(condition(equal), keys, string("c")), "");
+}
+
+TEST(JoinTable, AnItemOfManyKeysIsSelectedOnce) {
+  const std::vector<Value> keys = {sequence({untyped("a"), untyped("b")}), untyped("b")};
+  EXPECT_EQ(selected(condition(equal), keys, sequence({untyped("b"), untyped("a")})), "0 1");
+}
+
+TEST(JoinTable, UntypedKeysMeetNumbersAsNumbersAndOthersAreAsked) {
+  const std::vector<Value> keys = {untyped("1"), untyped("01"), untyped("x"), string("1")};
+  EXPECT_EQ(selected(condition(equal), keys, integer(1)), "0 1 2? 3?");
+  EXPECT_EQ(selected(condition(less), {untyped("5"), untyped("50")}, integer(10)), "0");
+}
+
+TEST(JoinTable, NaNMeetsNothing) {
+  EXPECT_EQ(selected(condition(less, true), {number(1), nan()}, number(1)), "0");
+  EXPECT_EQ(selected(condition(equal), {number(1), nan()}, nan()), "");
+}
+
+TEST(JoinTable, DecimalsThatAreNoDoublesAreComparedThePlainWay) {
+  const std::vector<Value> keys = {integer(9007199254740993), integer(1)};
+  EXPECT_EQ(selected(condition(equal), keys, integer(1)), "plain");
+  EXPECT_EQ(selected(condition(equal), keys, number(1)), "1");
+  EXPECT_EQ(selected(condition(equal), {integer(1)}, integer(9007199254740993)), "plain");
+}
+
+TEST(JoinTable, KeysThatCannotBeReadOrMixKindsAreAsked) {
+  const std::vector<Value> keys = {untyped("1"), Value(), integer(1), boolean(true), empty()};
+  EXPECT_EQ(selected(condition(equal), keys, untyped("1")), "0 1? 2? 3?");
+  EXPECT_EQ(selected(condition(equal), keys, empty()), "1? 2? 3?");
+}
+
+TEST(JoinTable, OtherProbesAreComparedThePlainWay) {
+  EXPECT_EQ(selected(condition(equal), {untyped("true")}, boolean(true)), "plain");
+  EXPECT_EQ(selected(condition(equal), {untyped("1")}, sequence({untyped("1"), integer(1)})),
+            "plain");
+  EXPECT_EQ(selected(condition(equal), {untyped("1")}, Value()), "plain");
+}
+
+TEST(JoinTable, AValueComparisonTakesOneKeyAndOneProbe) {
+  const auto eq = condition(equal, false, true);
+  EXPECT_EQ(selected(eq, {sequence({untyped("a"), untyped("b")}), untyped("a")}, string("a")),
+            "0? 1");
+  EXPECT_EQ(selected(eq, {untyped("a")}, sequence({string("a"), string("b")})), "plain");
+  EXPECT_EQ(selected(eq, {untyped("1")}, integer(1)), "plain");
+}
+
+}  // namespace
+}  // namespace xquery
