@@ -349,7 +349,7 @@ Value XQueryGeneralComparisonWithRange(int type, const Value& left, int64_t firs
   }
   const XQueryRelation relation = XQueryRelationForCode(type + generalToValue);
   const XQueryItemList items(left.get());
-  if (items.count() == 0) return Value();
+  if (items.count() == 0) return left ? Value(NSNull::null()) : Value();
   // An item that cannot be atomized fails before any pair is looked at.
   WorkPacer pacer;
   for (size_t i = 0; i < items.count(); ++i) {

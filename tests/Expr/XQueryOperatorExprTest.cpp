@@ -242,6 +242,7 @@ TEST(ComparisonWithRange, MakesNoIntegers) {
   EXPECT_EQ(evaluateExpr(*binary(XQueryOperatorEqual, literal(untyped("5")), all())), "true");
   EXPECT_EQ(evaluateExpr(*binary(XQueryOperatorEqual, literal(decimal("5")), all())),
             "error 0 limit: range of too many items");
+  EXPECT_EQ(evaluateExpr(*binary(XQueryOperatorEqual, literal(empty()), all())), "()");
   auto parentheses = XQueryExprList::exprList();
   parentheses->addObject(all());
   EXPECT_EQ(evaluateExpr(*binary(XQueryOperatorLess, literal(integer(5)), parentheses)), "true");
