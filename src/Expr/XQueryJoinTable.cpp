@@ -70,6 +70,19 @@ Key decidingProbe(XQueryRelation relation, const std::vector<Key>& probes) {
                        : *std::min_element(probes.begin(), probes.end(), below);
 }
 
+// So that every key is found once.
+template <class Key>
+void keepDistinct(std::vector<Key>& probes) {
+  if (probes.size() < 2) return;
+  WorkPacer pacer;
+  std::sort(probes.begin(), probes.end(), [&pacer](const Key& a, const Key& b) {
+    pacer.turn();
+    return orderOf(a, b) < 0;
+  });
+  const auto areEqual = [](const Key& a, const Key& b) { return isEqual(a, b); };
+  probes.erase(std::unique(probes.begin(), probes.end(), areEqual), probes.end());
+}
+
 // In the order of the items, each once; an item that has to be asked stays one.
 void arrange(XQueryJoinTable::Selection& selection) {
   const auto before = [](const auto& a, const auto& b) {
@@ -262,7 +275,7 @@ void XQueryJoinTable::selectByText(const Operands& probes, Selection& selection)
   }
   std::vector<NSStringView> texts;
   for (const Operand& probe : probes) texts.push_back(probe.text.view());
-  selectBy(_texts, texts, _textChains, hashOfText, selection);
+  selectBy(_texts, std::move(texts), _textChains, hashOfText, selection);
 }
 
 void XQueryJoinTable::selectByNumber(const Operands& probes, Selection& selection) {
@@ -273,11 +286,12 @@ void XQueryJoinTable::selectByNumber(const Operands& probes, Selection& selectio
     probe.scan();
     if (!std::isnan(probe.number)) numbers.push_back(probe.number);
   }
-  if (!numbers.empty()) selectBy(_numbers, numbers, _numberChains, hashOfDouble, selection);
+  if (numbers.empty()) return;
+  selectBy(_numbers, std::move(numbers), _numberChains, hashOfDouble, selection);
 }
 
 template <class Key, class HashOf>
-void XQueryJoinTable::selectBy(const std::vector<Key>& keys, const std::vector<Key>& probes,
+void XQueryJoinTable::selectBy(const std::vector<Key>& keys, std::vector<Key> probes,
                                Chains& chains, HashOf hashOf, Selection& selection) {
   WorkPacer pacer;
   if (_relation.test != XQueryRelation::Equal) {
@@ -292,6 +306,7 @@ void XQueryJoinTable::selectBy(const std::vector<Key>& keys, const std::vector<K
   if (!chains.isBuilt()) {
     chains.build(keys.size(), [&](size_t key) { return hashOf(keys[key]); });
   }
+  keepDistinct(probes);
   for (const Key& probe : probes) {
     for (uint32_t key = chains.first(hashOf(probe)); key != Chains::end; key = chains.next(key)) {
       pacer.turn();

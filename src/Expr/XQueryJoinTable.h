@@ -103,7 +103,7 @@ class XQueryJoinTable {
   void selectByText(const Operands& probes, Selection& selection);
   void selectByNumber(const Operands& probes, Selection& selection);
   template <class Key, class HashOf>
-  void selectBy(const std::vector<Key>& keys, const std::vector<Key>& probes, Chains& chains,
+  void selectBy(const std::vector<Key>& keys, std::vector<Key> probes, Chains& chains,
                 HashOf hashOf, Selection& selection);
   void countMemory();
 

@@ -55,6 +55,33 @@ TEST(JoinTable, AnItemOfManyKeysIsSelectedOnce) {
   EXPECT_EQ(selected(condition(equal), keys, sequence({untyped("b"), untyped("a")})), "0 1");
 }
 
+// As pairs they would fill gigabytes.
+TEST(JoinTable, AKeyMeetsEqualProbesOnce) {
+  constexpr size_t many = 30000;
+  const std::vector<Value> keys(many, string("a"));
+  XQueryJoinTable table(condition(equal), keys, [&](size_t position) { return keys[position]; });
+  XQueryJoinTable::Selection selection;
+  ASSERT_TRUE(table.select(sequence(keys), selection));
+  EXPECT_EQ(selection.size(), many);
+  EXPECT_EQ(selected(condition(equal), {number(0), number(1)},
+                     sequence({number(1), number(-0.0), number(0), number(1), nan()})),
+            "0 1");
+}
+
+TEST(JoinTable, ItemsOfThousandsOfKeysMakeNone) {
+  const auto isComplete = [](size_t items, size_t keysOfEach) {
+    const Value keys = sequence(std::vector<Value>(keysOfEach, string("a")));
+    return XQueryJoinTable(condition(equal), std::vector<Value>(items, string("i")),
+                           [&](size_t) { return keys; })
+        .isComplete();
+  };
+  constexpr size_t most = XQueryJoinTable::keysOfAnyItems;
+  EXPECT_TRUE(isComplete(1, most));
+  EXPECT_FALSE(isComplete(1, most + 1));
+  EXPECT_TRUE(isComplete(most / 16, 32));
+  EXPECT_FALSE(isComplete(most / 16, 33));
+}
+
 TEST(JoinTable, UntypedKeysMeetNumbersAsNumbersAndOthersAreAsked) {
   const std::vector<Value> keys = {untyped("1"), untyped("01"), untyped("x"), string("1")};
   EXPECT_EQ(selected(condition(equal), keys, integer(1)), "0 1 2? 3?");
