@@ -1,12 +1,10 @@
 // Importing library modules through the public interface.
+#include "Platform/LoadingTestSupport.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>
 
-#include <filesystem>
-#include <fstream>
 #include <string>
-#include <unistd.h>
 #include <vector>
 
 namespace xquery {
@@ -50,23 +48,12 @@ class Embedding : public testing::Test {
 
 class ModuleImport : public Embedding {
  protected:
-  void SetUp() override {
-    folder = std::filesystem::temp_directory_path() /
-             ("xquery-embedding-" + std::to_string(getpid()) + "-" + unique());
-    std::filesystem::create_directory(folder);
-  }
-  void TearDown() override { std::filesystem::remove_all(folder); }
-  static std::string unique() {
-    return testing::UnitTest::GetInstance()->current_test_info()->name();
-  }
   // Writes a module and answers its URL in quotes.
   std::string module(const std::string& name, std::string_view text) {
-    std::ofstream(folder / name, std::ios::binary) << text;
+    folder.write(name, text);
     return location(name);
   }
-  std::string location(const std::string& name) const {
-    return "\"file://" + (folder / name).string() + "\"";
-  }
+  std::string location(const std::string& name) const { return "\"" + folder.URL(name) + "\""; }
   std::vector<int64_t> numbers(const std::string& source) const {
     std::vector<int64_t> all;
     if (const auto errors = XQuery::xqueryWithSource(std::string_view(source))->parseErrors()) {
@@ -74,7 +61,7 @@ class ModuleImport : public Embedding {
     }
     return all;
   }
-  std::filesystem::path folder;
+  const TestFolder folder;
 };
 
 TEST_F(ModuleImport, ImportedVariablesAreSeen) {

@@ -5,6 +5,8 @@
 
 #include <gtest/gtest.h>
 
+#include <cctype>
+#include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <string>
@@ -12,6 +14,20 @@
 #include <unistd.h>
 
 namespace xquery {
+
+// The URL of the file or folder of that path, whatever characters it has.
+inline std::string fileURL(const std::string& path) {
+  constexpr std::string_view plain = "/-._~";
+  std::string URL = "file://";
+  for (const unsigned char byte : path) {
+    char escaped[4];
+    std::snprintf(escaped, sizeof escaped, "%%%02X", byte);
+    const bool isPlain =
+        byte < 0x80 && (std::isalnum(byte) || plain.find(static_cast<char>(byte)) != plain.npos);
+    URL += isPlain ? std::string(1, static_cast<char>(byte)) : escaped;
+  }
+  return URL;
+}
 
 class TestFolder {
  public:
@@ -33,7 +49,8 @@ class TestFolder {
     std::ofstream(_path / name, std::ios::binary) << text;
     return URL(name);
   }
-  std::string URL(const std::string& name) const { return "file://" + path(name); }
+  // The name is to be written as in a URL.
+  std::string URL(const std::string& name) const { return fileURL(path()) + "/" + name; }
 
  private:
   std::filesystem::path _path;

@@ -49,7 +49,7 @@ TEST(LocalFile, EscapesInThePathAreDecoded) {
 TEST(LocalFile, FormsOfTheUrl) {
   TestFolder folder;
   folder.write("a.xml", "here");
-  const std::string path = folder.path("a.xml");
+  const std::string path = folder.URL("a.xml").substr(std::string_view("file://").size());
   for (const std::string& URL :
        {"file://" + path, "file:" + path, "FILE://" + path, "file://localhost" + path,
         "file://" + path + "#part", "file://" + path + "?query"}) {

@@ -1,12 +1,11 @@
 // HTML, tidied and then parsed like any document.
+#include "Platform/LoadingTestSupport.h"
 #include "Platform/ProcessorTime.h"
 #include "Platform/Tidy.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
 
-#include <cstdio>
-#include <fstream>
 #include <random>
 #include <string>
 #include <string_view>
@@ -129,14 +128,15 @@ TEST(TidyDocument, WithoutTheOptionHtmlIsNotRead) {
 }
 
 TEST(TidyDocument, IsReadFromAFileToo) {
-  const std::string path = testing::TempDir() + "tidy-document.html";
-  std::ofstream(path) << "<p>a<br>b";
+  const TestFolder folder;
+  folder.write("a.html", "<p>a<br>b");
+  const std::string path = folder.path("a.html");
   NSXMLParseError error;
   const auto document = NSXMLDocument::documentWithFile(path, NSXMLDocumentTidyHTML, &error);
-  std::remove(path.c_str());
   ASSERT_TRUE(document) << error.message;
   EXPECT_EQ(document->stringValue()->utf8(), "ab");
-  EXPECT_FALSE(NSXMLDocument::documentWithFile(path, NSXMLDocumentTidyHTML, &error));
+  EXPECT_FALSE(
+      NSXMLDocument::documentWithFile(folder.path("none.html"), NSXMLDocumentTidyHTML, &error));
   EXPECT_EQ(error.line, 0);
 }
 

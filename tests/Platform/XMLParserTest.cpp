@@ -1,13 +1,11 @@
 #include "Platform/LibXML.h"
+#include "Platform/LoadingTestSupport.h"
 #include "Platform/XMLTestSupport.h"
 #include "Platform/XMLTree.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
 
-#include <chrono>
-#include <cstdlib>
-#include <fstream>
 #include <string>
 #include <unistd.h>
 
@@ -156,29 +154,15 @@ TEST(XMLParser, EncodingsAreRecognised) {
   }
 }
 
-class TemporaryFile {
- public:
-  explicit TemporaryFile(std::string_view text) {
-    const int descriptor = mkstemp(_path.data());
-    EXPECT_GE(descriptor, 0);
-    EXPECT_EQ(write(descriptor, text.data(), text.size()), static_cast<ssize_t>(text.size()));
-    close(descriptor);
-  }
-  ~TemporaryFile() { unlink(_path.c_str()); }
-  const std::string& path() const { return _path; }
-
- private:
-  std::string _path = ::testing::TempDir() + "xmlparserXXXXXX";
-};
-
 TEST(XMLParser, AFileIsReadInPieces) {
   std::string text = "<a>";
   for (int index = 0; index < 50000; ++index) text += "<b>" + std::to_string(index) + "</b>";
   text += "</a>";
-  const TemporaryFile file(text);
+  const TestFolder folder;
+  folder.write("a.xml", text);
   NSXMLParseError error;
   const auto document =
-      NSXMLDocument::documentWithFile(file.path(), NSXMLNodePreserveWhitespace, &error);
+      NSXMLDocument::documentWithFile(folder.path("a.xml"), NSXMLNodePreserveWhitespace, &error);
   ASSERT_TRUE(document) << error.message;
   EXPECT_EQ(described(document.get()), described(parsed(text).get()));
 }
@@ -194,9 +178,10 @@ TEST(XMLParser, AFileThatCannotBeReadIsAnErrorWithoutALine) {
 }
 
 TEST(XMLParser, AMinusIsStandardInput) {
-  const TemporaryFile file("<from-standard-input/>");
+  const TestFolder folder;
+  folder.write("a.xml", "<from-standard-input/>");
   const int saved = dup(STDIN_FILENO);
-  ASSERT_TRUE(freopen(file.path().c_str(), "r", stdin));
+  ASSERT_TRUE(freopen(folder.path("a.xml").c_str(), "r", stdin));
   NSXMLParseError error;
   const auto document = NSXMLDocument::documentWithFile("-", 0, &error);
   dup2(saved, STDIN_FILENO);
@@ -282,18 +267,21 @@ TEST(XMLParser, InternalEntitiesAreSubstituted) {
 }
 
 TEST(XMLParser, ExternalEntitiesAreRefused) {
-  const TemporaryFile secret("the secret");
-  const std::string declaration = "<!DOCTYPE a [<!ENTITY e SYSTEM '" + secret.path() + "'>]>";
+  const TestFolder folder;
+  const std::string secret = folder.write("a.txt", "the secret");
+  const std::string declaration = "<!DOCTYPE a [<!ENTITY e SYSTEM '" + secret + "'>]>";
   EXPECT_EQ(errorOf(declaration + "<a>&e;</a>").message, "external entities are not read");
   EXPECT_EQ(errorOf(declaration + "<a x='&e;'/>").message.find("the secret"), std::string::npos);
   EXPECT_TRUE(parsed(declaration + "<a/>")) << "a declaration alone does no harm";
-  EXPECT_EQ(errorOf("<!DOCTYPE a [<!ENTITY % e SYSTEM '" + secret.path() + "'>%e;]><a/>").message,
+  EXPECT_EQ(errorOf("<!DOCTYPE a [<!ENTITY % e SYSTEM '" + secret + "'>%e;]><a/>").message,
             "external entities are not read");
 }
 
 TEST(XMLParser, AnExternalDTDIsNotRead) {
-  const TemporaryFile subset("<!ATTLIST a x CDATA 'from outside'><!ENTITY e 'outside'>");
-  const std::string type = "<!DOCTYPE a SYSTEM '" + subset.path() + "'>";
+  const TestFolder folder;
+  const std::string subset =
+      folder.write("a.dtd", "<!ATTLIST a x CDATA 'from outside'><!ENTITY e 'outside'>");
+  const std::string type = "<!DOCTYPE a SYSTEM '" + subset + "'>";
   EXPECT_EQ(parsed(type + "<a/>")->rootElement()->attributeCount(), 0u);
   EXPECT_NE(errorOf(type + "<a>&e;</a>").message.find("not defined"), std::string::npos);
 }

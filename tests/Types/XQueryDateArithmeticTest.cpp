@@ -219,12 +219,12 @@ TEST_F(DateArithmetic, SecondsMoveADateByWholeDaysOfItsCalendar) {
 
 TEST_F(DateArithmetic, SecondsMoveATimeAroundMidnight) {
   const Row rows[] = {
-      {"23:30:00", "PT1H", "00:30:00"},
-      {"00:30:00", "-PT1H", "23:30:00"},
-      {"12:00:00", "P3DT1H", "13:00:00"},
+      {"23:30:00Z", "PT1H", "00:30:00Z"},
+      {"00:30:00Z", "-PT1H", "23:30:00Z"},
+      {"12:00:00Z", "P3DT1H", "13:00:00Z"},
       {"12:00:00Z", "PT12H", "00:00:00Z"},
       {"23:59:59.5-08:00", "PT0.5S", "00:00:00-08:00"},
-      {"12:00:00", "-P1D", "12:00:00"},
+      {"12:00:00Z", "-P1D", "12:00:00Z"},
       {"01:00:00+14:00", "-PT2H", "23:00:00+14:00"},
   };
   for (const Row& row : rows) {
@@ -340,6 +340,8 @@ TEST_F(LocalArithmetic, WithoutAZoneTheLocalOneDecides) {
 // A time without a zone is an instant by the local clock, but its sum is read in GMT.
 TEST_F(LocalArithmetic, ASumOfATimeWithoutAZoneIsReadInGMT) {
   EXPECT_IN_ZONE("UTC", sum(23, "23:30:00", "PT1H"), "00:30:00");
+  EXPECT_IN_ZONE("UTC", sum(23, "00:30:00", "-PT1H"), "23:30:00");
+  EXPECT_IN_ZONE("UTC", sum(23, "12:00:00", "P3DT1H"), "13:00:00");
   EXPECT_IN_ZONE("Europe/Berlin", sum(23, "23:30:00", "PT1H"), "23:30:00");
   EXPECT_IN_ZONE("Asia/Kathmandu", sum(23, "12:00:00", "PT1H"), "07:15:00");
   EXPECT_IN_ZONE("Europe/Berlin", sum(23, "23:30:00Z", "PT1H"), "00:30:00Z");
