@@ -58,6 +58,11 @@ Value fn_doc(const Value* arguments, size_t count, XQueryContext& context) {
   return URL ? context._internal().XQueryDocumentForURL(URL) : Value();
 }
 
+// There are no collections: every call is refused.
+Value fn_collection(const Value*, size_t, XQueryContext&) {
+  return Value();
+}
+
 Value fn_resolve_uri(const Value* arguments, size_t count, XQueryContext& context) {
   if (count < 1 || count > 2) return Value();
   if (isNull(arguments[0])) return arguments[0];

@@ -14,6 +14,7 @@ class XQueryContext;
 Value fn_base_uri(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_document_uri(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_doc(const Value* arguments, size_t count, XQueryContext& context);
+Value fn_collection(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_resolve_uri(const Value* arguments, size_t count, XQueryContext& context);
 
 // The reference resolved against the static base URI; by itself where there is none that anything

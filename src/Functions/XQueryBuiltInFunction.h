@@ -8,6 +8,7 @@
 #include "xquery/Object.h"
 
 #include <cstddef>
+#include <cstdint>
 #include <span>
 #include <string_view>
 
@@ -26,16 +27,21 @@ class XQueryBuiltInFunction : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::BuiltInFunction; }
 
+  // What the analysis of expressions may count on.
+  enum Traits : uint8_t {
+    // The function answers equal values for the same arguments, fails alike, looks at nothing else
+    // and does nothing else. Holds for calls with at least one argument: without any, some of these
+    // functions take the context item.
+    ReadsArgumentsOnly = 1,
+    // It answers truth values and nothing else.
+    AnswersTruth = 2,
+    // A call asks the host for a document, which the host can tell.
+    LoadsDocuments = 4,
+  };
+
   [[nodiscard]] static Ref<XQueryBuiltInFunction> builtInFunctionWithProc(XQueryProcedure proc);
   XQueryProcedure proc() const { return _proc; }
-  // Whether the function answers equal values for the same arguments, fails alike, looks at nothing
-  // else and does nothing else. Holds for calls with at least one argument: without any, some of
-  // these functions take the context item.
-  bool readsArgumentsOnly() const { return _readsArgumentsOnly; }
-  // Whether a call asks the host for a document, which the host can tell.
-  bool loadsDocuments() const;
-  // Whether the function answers truth values and nothing else.
-  bool answersTruth() const;
+  bool has(Traits trait) const { return (_traits & trait) != 0; }
 
   // Null for a name that is not registered.
   static XQueryProcedure functionForQName(const Ref<XQueryQName>& qName);
@@ -44,22 +50,21 @@ class XQueryBuiltInFunction : public NSCounted {
   struct Registration {
     XQueryNamespaceID namespaceID;
     std::string_view localName;
-    XQueryProcedure proc;  // null: every call fails as one with wrong arguments
+    XQueryProcedure proc;
+    uint8_t traits = 0;
   };
   // Every built-in function, in the order of registration.
   static std::span<const Registration> registrations();
 
  protected:
-  explicit XQueryBuiltInFunction(XQueryProcedure initWithProc, bool readsArgumentsOnly = false)
-      : NSCounted(Kind::BuiltInFunction),
-        _proc(initWithProc),
-        _readsArgumentsOnly(readsArgumentsOnly) {}
+  explicit XQueryBuiltInFunction(XQueryProcedure initWithProc, uint8_t traits = 0)
+      : NSCounted(Kind::BuiltInFunction), _proc(initWithProc), _traits(traits) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
   XQueryProcedure _proc;
-  bool _readsArgumentsOnly;
+  uint8_t _traits;
 };
 
 }  // namespace xquery

@@ -64,9 +64,10 @@ void XQueryFunctionCall::bindInfoForProlog(XQueryProlog& prolog) {
   if (const auto qName = prolog.functionQNameFromString(_name)) {
     if (const auto* entry = XQueryBuiltInFunction::entryForQName(qName)) {
       _function = entry->proc();
-      _readsArgumentsOnly = entry->readsArgumentsOnly() && argumentCount() > 0;
-      _loadsDocuments = entry->loadsDocuments();
-      _answersTruth = entry->answersTruth();
+      using Function = XQueryBuiltInFunction;
+      _readsArgumentsOnly = entry->has(Function::ReadsArgumentsOnly) && argumentCount() > 0;
+      _loadsDocuments = entry->has(Function::LoadsDocuments);
+      _answersTruth = entry->has(Function::AnswersTruth);
     }
     if (!_function) _functionDecl = prolog.functionInfoForSignature({qName, argumentCount()});
   }

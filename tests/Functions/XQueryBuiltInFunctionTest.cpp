@@ -1,5 +1,7 @@
 #include "Functions/FunctionsTesting.h"
 #include "Functions/XQueryBuiltInFunction.h"
+#include "Prolog/PrologTesting.h"
+#include "Prolog/XQueryPrologItems.h"
 
 #include <algorithm>
 #include <set>
@@ -128,26 +130,112 @@ TEST(Registry, ThePrefixOfANameDoesNotMatter) {
             procedureNamed("count", standardURI));
 }
 
-TEST(Registry, FunctionsWithAProcedureOfTheirOwnDoNotShareIt) {
+TEST(Registry, EveryFunctionHasAProcedureOfItsOwn) {
   std::set<XQueryProcedure> procedures;
-  size_t count = 0;
   for (const auto& row : XQueryBuiltInFunction::registrations()) {
-    if (!row.proc) continue;
-    ++count;
+    EXPECT_TRUE(row.proc) << row.localName;
     procedures.insert(row.proc);
   }
-  EXPECT_EQ(procedures.size(), count);
+  EXPECT_EQ(procedures.size(), XQueryBuiltInFunction::registrations().size());
 }
 
-TEST(Registry, AFunctionWithoutProcedureFailsAsWithWrongArguments) {
-  for (const auto& row : XQueryBuiltInFunction::registrations()) {
-    if (row.proc) continue;
-    const std::string prefix = row.namespaceID == XQueryNamespaceExt ? "ext:" : "fn:";
-    const std::string name = prefix + std::string(row.localName);
+TEST(Registry, SomeFunctionsHaveNoAnswerToAnyArguments) {
+  for (const std::string name : {"fn:collection", "ext:binary-insert", "ext:binary-remove"}) {
     for (const char* arguments : {"()", "(1)", "('a', 'b')", "(1, 2, 3, 4)"}) {
       EXPECT_EQ(answer(name + arguments),
                 "error 17 line 1 invalid arguments to function - " + name);
     }
+  }
+}
+
+// --- traits --------------------------------------------------------------------------------------
+
+// What the function answers, or the error that it raises.
+Value answered(XQueryProcedure procedure, const std::vector<Value>& arguments,
+               XQueryContext& context) {
+  try {
+    return procedure(arguments.data(), arguments.size(), context);
+  } catch (const NSException&) {
+    return context._internal().error();
+  }
+}
+
+std::vector<std::vector<Value>> sampleArguments(size_t count) {
+  const Value samples[] = {
+      functiontest::string("a"),
+      functiontest::integer(1),
+      functiontest::untyped("2004-10-29"),
+      functiontest::empty(),
+      functiontest::elementFrom("<a xml:lang='en' n='1'><b/>a</a>"),
+      functiontest::sequence({functiontest::integer(2), functiontest::integer(1)})};
+  std::vector<std::vector<Value>> lists = {{}};
+  for (size_t index = 0; index < count; ++index) {
+    std::vector<std::vector<Value>> longer;
+    for (const auto& list : lists) {
+      for (const Value& sample : samples) {
+        longer.push_back(list);
+        longer.back().push_back(sample);
+      }
+    }
+    lists = std::move(longer);
+  }
+  return lists;
+}
+
+TEST(Traits, WhatAnswersTruthAnswersNothingElse) {
+  const auto context = XQueryContext::xqueryContext();
+  context->_internal().setContextItem(functiontest::elementFrom("<a xml:lang='a'/>"), 1);
+  for (const auto& row : XQueryBuiltInFunction::registrations()) {
+    if (!(row.traits & XQueryBuiltInFunction::AnswersTruth)) continue;
+    bool isAnswered = false;
+    for (size_t count = 0; count <= 3; ++count) {
+      for (const auto& arguments : sampleArguments(count)) {
+        const Value answer = answered(row.proc, arguments, *context);
+        if (!answer || isa<XQueryError>(answer)) continue;
+        isAnswered = true;
+        EXPECT_EQ(XQueryObjectTypeID(answer.get()), XQueryTypeBoolean) << row.localName;
+      }
+    }
+    EXPECT_TRUE(isAnswered) << row.localName;
+  }
+}
+
+// Another focus and another default namespace make no difference.
+TEST(Traits, WhatReadsItsArgumentsOnlyAnswersAlikeEverywhere) {
+  const auto here = XQueryContext::xqueryContext();
+  const auto there = XQueryContext::xqueryContext();
+  const auto prolog = prologOf({XQueryPrologItemDefaultElementNamespace::elementNamespace(
+      NSString::stringWithASCII("urn:d"), 0)});
+  there->_internal().setActiveProlog(prolog.get());
+  there->_internal().setContextItem(functiontest::elementFrom("<a xml:lang='a'/>"), 3);
+  there->_internal().setLast(5);
+  const auto shown = [](const Value& value) {
+    const auto* name = dyn_cast<XQueryQName>(value);
+    return name ? name->description()->utf8() : functiontest::show(value);
+  };
+  std::set<std::string> differing;
+  for (const auto& row : XQueryBuiltInFunction::registrations()) {
+    const bool readsOnly = (row.traits & XQueryBuiltInFunction::ReadsArgumentsOnly) != 0;
+    if (!readsOnly && row.namespaceID == XQueryNamespaceExt) continue;
+    for (size_t count = 1; count <= 3; ++count) {
+      for (const auto& arguments : sampleArguments(count)) {
+        if (shown(answered(row.proc, arguments, *here)) ==
+            shown(answered(row.proc, arguments, *there))) {
+          continue;
+        }
+        differing.emplace(row.localName);
+        EXPECT_FALSE(readsOnly) << row.localName;
+      }
+    }
+  }
+  EXPECT_EQ(differing, (std::set<std::string>{"QName", "id", "idref", "lang"}));
+}
+
+TEST(Traits, OneFunctionAsksForDocuments) {
+  for (const auto& row : XQueryBuiltInFunction::registrations()) {
+    EXPECT_EQ((row.traits & XQueryBuiltInFunction::LoadsDocuments) != 0,
+              row.proc == procedureNamed("doc", standardURI))
+        << row.localName;
   }
 }
 
