@@ -55,10 +55,10 @@ struct UnitRange {
   uint32_t count = 0;
 };
 
+// Of a start that is not behind the text.
 UnitRange rangeOfSubstring(uint32_t textLength, int64_t start, std::optional<int64_t> length) {
   const int64_t end = textLength;
   int64_t from = start - 1;
-  if (from >= end) return {};
   if (!length) {
     from = std::max<int64_t>(from, 0);
     return {static_cast<uint32_t>(from), static_cast<uint32_t>(end - from)};
@@ -106,7 +106,9 @@ Value fn_substring(const Value* arguments, size_t count, XQueryContext& context)
   const NSStringView text = cast<NSString>(source)->view();
   const std::optional<int64_t> from = roundedPosition(start, context);
   // From minus infinity nothing can be reached, however long the part is.
-  if (!from || (*from < 0 && isInfinite(start))) return XQueryString::stringWithView({});
+  if (!from || *from > text.length() || (*from < 0 && isInfinite(start))) {
+    return XQueryString::stringWithView({});
+  }
   std::optional<int64_t> units;
   if (count == 3) {
     units = roundedPosition(length, context);

@@ -251,6 +251,15 @@ TEST(Substring, OnlyTheWholeSourceToItsEndKeepsItsType) {
   EXPECT_EQ(tokenPart({integer(1), integer(5)}), "string 12345");
 }
 
+// Its first position is behind its end, so that nothing is left of it from there; before it there
+// is the whole of it.
+TEST(Substring, OfAnEmptyTokenFromItsStartIsTheEmptyString) {
+  const Value token = typed(XQueryTypeToken, "");
+  EXPECT_EQ(call(fn_substring, {token, integer(1)}), "string ");
+  EXPECT_EQ(call(fn_substring, {token, integer(1), infinity()}), "string ");
+  EXPECT_EQ(call(fn_substring, {token, integer(0)}), "token ");
+}
+
 TEST(Substring, AnEmptyStartOrLengthGivesNothing) {
   EXPECT_EQ(part(empty()), "string ");
   EXPECT_EQ(part(empty(), integer(1)), "string ");
