@@ -2,6 +2,9 @@
 
 #include <gtest/gtest.h>
 
+#include <fstream>
+#include <iterator>
+#include <string>
 #include <string_view>
 
 namespace xquery {
@@ -22,6 +25,9 @@ constexpr Row row(const XQueryErrorText<places>& entry, int64_t number, std::str
 const Row rows[] = {
     row(XQueryErrors::nestedTooDeeply, 0, "limit: expression nested too deeply"),
     row(XQueryErrors::outOfMemory, 0, "limit: out of memory"),
+    row(XQueryErrors::deadlinePassed, 0, "limit: deadline passed"),
+    row(XQueryErrors::evaluationCancelled, 0, "limit: evaluation cancelled"),
+    row(XQueryErrors::memoryCeilingReached, 0, "limit: memory ceiling reached"),
     row(XQueryErrors::tooManyDigits, 0, "limit: number of too many digits"),
     row(XQueryErrors::rangeTooLong, 0, "limit: range of too many items"),
     row(XQueryErrors::unresolvedQName, 1, "can't resolve QName for \"%@\""),
@@ -90,7 +96,18 @@ const Row rows[] = {
         "fn:one-or-more called with a sequence containing zero items"),
     row(XQueryErrors::notExactlyOne, 6,
         "fn:exactly-one called with a sequence containing zero or more than one item"),
+    row(XQueryErrors::unsupportedNormalizationForm, 0,
+        "err:FOCH0003 - unsupported normalization form"),
 };
+
+TEST(ErrorCatalogue, EveryRowIsTested) {
+  std::ifstream in(XQUERY_SOURCE_DIR "/src/Types/XQueryErrors.h");
+  size_t count = 0;
+  for (std::string line; std::getline(in, line);) {
+    count += line.starts_with("inline constexpr XQueryErrorText<");
+  }
+  EXPECT_EQ(count, std::size(rows));
+}
 
 TEST(ErrorCatalogue, EveryRowHasItsNumberAndText) {
   for (const Row& row : rows) {
