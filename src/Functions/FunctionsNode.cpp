@@ -54,6 +54,12 @@ bool isNoNumber(NSStringView text) {
   return !scanDouble(text, ignored) && text != "NaN" && text != "INF" && text != "-INF";
 }
 
+// Of a cast that raised or would have: no error is left, not even one from before.
+Value noNumber(XQueryContext& context) {
+  context._internal().setError(nullptr, false);
+  return XQueryNumber::nan();
+}
+
 std::u16string primaryLanguage(NSStringView language) {
   return lowerCasedText(language.substring(0, language.find(u'-')).utf16());
 }
@@ -70,8 +76,10 @@ Value nodesForTokens(const Value* arguments, size_t count, Resolve resolve,
   const Ref<NSString> words =
       XQueryNormalizeString(cast<NSString>(XQueryPromoteToString(arguments[0], context)));
   XQueryGatherer found;
+  WorkPacer pacer;
   const uint32_t length = words->length();
   for (uint32_t start = 0; start <= length;) {
+    pacer.turn();
     const uint32_t end = std::min(words->view().find(u' ', start), length);
     if (Value each = resolve(node, words->view().substring(start, end - start))) {
       found.add(std::move(each));
@@ -109,19 +117,17 @@ Value fn_number(const Value* arguments, size_t count, XQueryContext& context) {
       XQueryAtomizationCheckingOccurrence(argument, XQueryOccurrenceAnyAlso, context);
   if (isNull(item)) return XQueryNumber::nan();
   const auto* text = dyn_cast<NSString>(item.get());
-  if (text && isNoNumber(text->view())) return XQueryNumber::nan();
+  if (text && isNoNumber(text->view())) return noNumber(context);
   return XQueryDoubleOrNaN(item, context);
 }
 
 // What does not cast to a double is NaN.
 Value XQueryDoubleOrNaN(const Value& item, XQueryContext& context) {
-  auto& dynamic = context._internal();
   try {
     return XQueryCastAsTypeForContext(item, XQueryTypeDouble, context);
   } catch (const NSException&) {
-    if (XQueryIsLimit(dynamic.error().get())) throw;
-    dynamic.setError(nullptr, false);
-    return XQueryNumber::nan();
+    if (XQueryIsLimit(context._internal().error().get())) throw;
+    return noNumber(context);
   }
 }
 
