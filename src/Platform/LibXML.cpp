@@ -342,9 +342,9 @@ bool Parse::run() {
   _parser = parser.get();
   xmlCtxtUseOptions(_parser, XML_PARSE_HUGE | XML_PARSE_NOENT | XML_PARSE_NONET);
   const bool isWellFormed = xmlParseDocument(_parser) == 0 && _parser->wellFormed;
-  if (_ended) std::rethrow_exception(_ended);
   if (!_failed && !isWellFormed) fail(nullptr);
   if (!_failed && !hasReadAll()) fail("extra content at the end of the document");
+  if (_ended) std::rethrow_exception(_ended);
   return !_failed;
 }
 
