@@ -312,35 +312,65 @@ void NSXMLTree::setURI(NSXMLDocument* document, const NSString* URI) {
   if (text) documents.push_back(document);
 }
 
+namespace {
+
+// A tree until it has its first node: where that cannot be made, the tree goes.
+class NewTree {
+ public:
+  NewTree() : _tree(NSXMLTree::create()) {}
+  ~NewTree() {
+    if (_tree) _tree->destroy();
+  }
+  NewTree(const NewTree&) = delete;
+  NewTree& operator=(const NewTree&) = delete;
+
+  NSXMLTree* operator->() const { return _tree; }
+  template <class Node>
+  Node* with(Node* first) {
+    _tree = nullptr;
+    return first;
+  }
+  // Adopted before anything can fail, so that the count of the name is not lost.
+  template <class Make>
+  auto* withNamed(const NSXMLName* name, Make make) {
+    _tree->adopt(name);
+    auto* const first = make(*_tree);
+    NSXMLTree::setAdoptedName(first, name);
+    return with(first);
+  }
+
+ private:
+  NSXMLTree* _tree;
+};
+
+}  // namespace
+
 NSXMLNode* NSXMLTree::makeLoneNode(Kind kind, NSStringView text) {
-  return create()->makeNode(kind, text);
+  NewTree tree;
+  return tree.with(tree->makeNode(kind, text));
 }
 
 NSXMLNode* NSXMLTree::makeLoneNode(Kind kind, NSStringView text, NSStringView name,
                                    NSStringView URI) {
-  NSXMLTree* tree = create();
-  NSXMLNode* node = tree->makeNode(kind, text);
-  tree->setName(node, NSXMLInternName(name, URI));
-  return node;
+  return NewTree().withNamed(NSXMLInternName(name, URI),
+                             [&](NSXMLTree& tree) { return tree.makeNode(kind, text); });
 }
 
 NSXMLElement* NSXMLTree::makeLoneElement(NSStringView name, NSStringView URI) {
-  NSXMLTree* tree = create();
-  NSXMLElement* element = tree->makeElement();
-  tree->setName(element, NSXMLInternName(name, URI));
-  return element;
+  return NewTree().withNamed(NSXMLInternName(name, URI),
+                             [](NSXMLTree& tree) { return tree.makeElement(); });
 }
 
 NSXMLElement* NSXMLTree::makeLoneElement(const NSXMLName* name, size_t roomBytes, NSXMLRoom& room) {
-  NSXMLTree* tree = create();
-  const size_t bytes = sizeof(NSXMLElement) + roomBytes;
-  NSXMLBlock* block = tree->allocateBlock(bytes);
-  auto* element = placeNode<NSXMLElement>(block + 1, uint16_t{sizeof(NSXMLBlock) / distanceUnit});
-  tree->setName(element, name);
-  room._block = reinterpret_cast<char*>(block);
-  room._cursor = reinterpret_cast<char*>(element + 1);
-  room._end = room._block + roundedUp(sizeof(NSXMLBlock) + bytes, blockGranule);
-  return element;
+  return NewTree().withNamed(name, [&](NSXMLTree& tree) {
+    const size_t bytes = sizeof(NSXMLElement) + roomBytes;
+    NSXMLBlock* block = tree.allocateBlock(bytes);
+    auto* element = placeNode<NSXMLElement>(block + 1, uint16_t{sizeof(NSXMLBlock) / distanceUnit});
+    room._block = reinterpret_cast<char*>(block);
+    room._cursor = reinterpret_cast<char*>(element + 1);
+    room._end = room._block + roundedUp(sizeof(NSXMLBlock) + bytes, blockGranule);
+    return element;
+  });
 }
 
 NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text, NSXMLRoom& room) {
@@ -365,10 +395,8 @@ NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text, NSXMLRoom& room) {
 }
 
 NSXMLNode* NSXMLTree::makeLoneAttribute(const NSXMLName* name, NSStringView text) {
-  NSXMLTree* tree = create();
-  NSXMLNode* attribute = tree->makeNode(Kind::Attribute, text);
-  tree->setName(attribute, name);
-  return attribute;
+  return NewTree().withNamed(name,
+                             [&](NSXMLTree& tree) { return tree.makeNode(Kind::Attribute, text); });
 }
 
 // --- merging ---------------------------------------------------------------------------------

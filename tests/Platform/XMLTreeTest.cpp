@@ -1,5 +1,6 @@
 // The structure of trees, document order, merging. What is computed lazily or by counting is
 // checked against a plain walk over generated trees.
+#include "Platform/WorkMeter.h"
 #include "Platform/XMLNames.h"
 #include "Platform/XMLTestSupport.h"
 #include "Platform/XMLTree.h"
@@ -472,6 +473,23 @@ TEST(XMLTree, ThreadsMayCreateAndDropNamesAtOnce) {
   one.join();
   two.join();
   EXPECT_EQ(NSXMLInternedNameCount(), before);
+}
+
+TEST(XMLTree, AFactoryThatFailsLeavesNothingBehind) {
+  const std::string text(200000, 't');
+  const int64_t bytes = workMeter.valueBytes;
+  const size_t names = NSXMLInternedNameCount();
+  workMeter.mostValueBytes = bytes + 100000;
+  EXPECT_THROW(static_cast<void>(NSXMLNode::textWithStringValue(A(text))), std::bad_alloc);
+  EXPECT_THROW(static_cast<void>(NSXMLNode::attributeWithName(A("failing"), A(text), A("urn:f"))),
+               std::bad_alloc);
+  EXPECT_THROW(static_cast<void>(NSXMLNode::processingInstructionWithName(A("failing"), A(text))),
+               std::bad_alloc);
+  EXPECT_EQ(workMeter.valueBytes, bytes);
+  EXPECT_EQ(NSXMLInternedNameCount(), names);
+  workMeter.mostValueBytes = INT64_MAX;
+  workMeter.wasRefused = false;
+  workMeter.stepsLeft = WorkMeter::manySteps;
 }
 
 }  // namespace
