@@ -49,7 +49,9 @@ bool NSXMLElement::addAttribute(const Ref<NSXMLNode>& attribute) {
 
 bool NSXMLElement::addNamespace(const Ref<NSXMLNode>& node) {
   if (!node || node->kind() != Kind::Namespace || node->parent()) return false;
+  WorkPacer pacer;
   for (const NSXMLNode* present = firstNamespace(); present; present = nextNamespace(present)) {
+    pacer.turn();
     if (present->nodeName() == node->nodeName()) return false;
   }
   NSXMLTree::appendProperty(this, node.get());

@@ -187,19 +187,34 @@ struct Declaration {
 class NamespaceScope {
  public:
   NSStringView URIForPrefix(NSStringView prefix) const {
-    if (prefix.isEmpty()) return _defaultURIs.empty() ? NSStringView() : _defaultURIs.back();
-    const auto found = _URIs.find(prefix);
-    return found == _URIs.end() || found->second.empty() ? NSStringView() : found->second.back();
+    const Prefix* known = find(prefix);
+    return known ? known->URI() : NSStringView();
   }
   bool isDeclared(NSStringView prefix) const { return !URIForPrefix(prefix).isEmpty(); }
 
   void declare(const NSXMLNode* element, const Declaration& declaration) {
-    URIsOf(declaration.prefix).push_back(declaration.URI);
+    at(declaration.prefix).meanings.push_back({element, declaration.URI});
     _declarations.push_back({element, declaration.prefix});
+  }
+  // A name in the start tag of the element has the prefix, whatever it means.
+  void use(const NSXMLNode* element, NSStringView prefix) { at(prefix).lastUser = element; }
+  // The same where the prefix has that meaning; otherwise nothing, and false.
+  bool useAs(const NSXMLNode* element, const Declaration& meaning) {
+    Prefix& known = at(meaning.prefix);
+    if (!known.URI().equals(meaning.URI)) return false;
+    known.lastUser = element;
+    return true;
+  }
+  // Whether the start tag of the element gives the prefix a meaning already.
+  bool isTaken(const NSXMLNode* element, NSStringView prefix) const {
+    const Prefix* known = find(prefix);
+    if (!known) return false;
+    return known->lastUser == element ||
+           (!known->meanings.empty() && known->meanings.back().element == element);
   }
   void leave(const NSXMLNode* element) {
     while (!_declarations.empty() && _declarations.back().element == element) {
-      URIsOf(_declarations.back().prefix).pop_back();
+      at(_declarations.back().prefix).meanings.pop_back();
       _declarations.pop_back();
     }
   }
@@ -208,16 +223,28 @@ class NamespaceScope {
   struct Less {
     bool operator()(NSStringView a, NSStringView b) const { return a.compare(b) < 0; }
   };
+  struct Meaning {
+    const NSXMLNode* element;
+    NSStringView URI;
+  };
+  struct Prefix {
+    NSStringView URI() const { return meanings.empty() ? NSStringView() : meanings.back().URI; }
+    std::vector<Meaning> meanings;
+    const NSXMLNode* lastUser = nullptr;
+  };
   struct Entry {
     const NSXMLNode* element;
     NSStringView prefix;
   };
-  std::vector<NSStringView>& URIsOf(NSStringView prefix) {
-    return prefix.isEmpty() ? _defaultURIs : _URIs[prefix];
+  const Prefix* find(NSStringView prefix) const {
+    if (prefix.isEmpty()) return &_default;
+    const auto found = _prefixes.find(prefix);
+    return found == _prefixes.end() ? nullptr : &found->second;
   }
+  Prefix& at(NSStringView prefix) { return prefix.isEmpty() ? _default : _prefixes[prefix]; }
 
-  std::vector<NSStringView> _defaultURIs;
-  std::map<NSStringView, std::vector<NSStringView>, Less> _URIs;
+  Prefix _default;
+  std::map<NSStringView, Prefix, Less> _prefixes;
   std::vector<Entry> _declarations;
 };
 
@@ -252,14 +279,11 @@ class Serializer {
   // The prefix to write the name of an attribute in a namespace with.
   NSStringView prefixForAttribute(const NSXMLElement* element, const NSXMLNode* attribute);
   NSStringView madePrefix(const NSXMLElement* element, NSStringView URI);
-  // Whether the start tag gives the prefix a meaning already.
-  bool isTaken(NSStringView prefix) const;
 
   const NSXMLNode* _root;
   Output& _out;
   NamespaceScope _scope;
   std::vector<Declaration> _declared;                 // in the start tag at hand
-  std::vector<NSStringView> _usedPrefixes;            // by the names in it
   std::vector<NSStringView> _attributePrefixes;       // of its attributes in turn
   std::map<std::string, NSStringView> _madePrefixes;  // by URI
   std::deque<std::string> _madeTexts;
@@ -363,8 +387,10 @@ void Serializer::writeStartTag(const NSXMLElement* element) {
     writeDeclaration(declaration);
   }
   size_t index = 0;
+  WorkPacer pacer;
   for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
        attribute = NSXMLElement::nextAttribute(attribute)) {
+    pacer.turn();
     _out.write(' ');
     const NSStringView prefix = _attributePrefixes[index++];
     const bool isPlain = attribute->URIView().isEmpty();
@@ -399,10 +425,13 @@ namespace {
 std::vector<Declaration> declarationsAbove(const NSXMLElement* element) {
   std::set<std::string> seen;
   std::vector<Declaration> found;
+  WorkPacer pacer;
   for (const NSXMLNode* node = element; node; node = node->parent()) {
+    pacer.turn();
     const auto* place = dyn_cast<NSXMLElement>(node);
     const NSXMLNode* own = place ? place->firstNamespace() : nullptr;
     for (; own; own = NSXMLElement::nextNamespace(own)) {
+      checkWork();
       const Declaration declaration{own->nameView(), own->textView()};
       if (!seen.insert(declaration.prefix.utf8()).second || place == element) continue;
       if (declaration.prefix.isEmpty() || declaration.URI.isEmpty()) continue;
@@ -417,13 +446,15 @@ class UsedPrefixes {
  public:
   explicit UsedPrefixes(const NSXMLElement* root) {
     const NSXMLNode* end = NSXMLTree::endOfSubtree(root);
+    WorkPacer pacer;
     for (const NSXMLNode* node = root; node != end; node = node->nextNode()) {
-      checkWork();
+      pacer.turn();
       const auto* element = dyn_cast<NSXMLElement>(node);
       if (!element) continue;
       add(element);
       for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
            attribute = NSXMLElement::nextAttribute(attribute)) {
+        pacer.turn();
         add(attribute);
       }
     }
@@ -456,10 +487,12 @@ void Serializer::declareInherited(const NSXMLElement* element) {
 
 void Serializer::declareForName(const NSXMLElement* element) {
   const Declaration needed{element->prefixView(), element->URIView()};
-  _usedPrefixes.push_back(needed.prefix);
   // A prefix without a URI is written as it is: there is nothing to declare it as.
-  if (isReserved(needed.prefix) || (!needed.prefix.isEmpty() && needed.URI.isEmpty())) return;
-  if (!_scope.URIForPrefix(needed.prefix).equals(needed.URI)) declare(element, needed);
+  if (isReserved(needed.prefix) || (!needed.prefix.isEmpty() && needed.URI.isEmpty())) {
+    _scope.use(element, needed.prefix);
+  } else if (!_scope.useAs(element, needed)) {
+    declare(element, needed);
+  }
 }
 
 NSStringView Serializer::prefixForAttribute(const NSXMLElement* element,
@@ -469,8 +502,8 @@ NSStringView Serializer::prefixForAttribute(const NSXMLElement* element,
   // other.
   if (needed.URI == "http://www.w3.org/XML/1998/namespace") return ascii("xml");
   if (!needed.prefix.isEmpty() && !isReserved(needed.prefix)) {
-    if (_scope.URIForPrefix(needed.prefix).equals(needed.URI)) return needed.prefix;
-    if (!isTaken(needed.prefix)) {
+    if (_scope.useAs(element, needed)) return needed.prefix;
+    if (!_scope.isTaken(element, needed.prefix)) {
       declare(element, needed);
       return needed.prefix;
     }
@@ -480,40 +513,29 @@ NSStringView Serializer::prefixForAttribute(const NSXMLElement* element,
 
 NSStringView Serializer::madePrefix(const NSXMLElement* element, NSStringView URI) {
   NSStringView& prefix = _madePrefixes[URI.utf8()];
-  if (!prefix.isEmpty() && _scope.URIForPrefix(prefix).equals(URI)) return prefix;
-  if (prefix.isEmpty() || isTaken(prefix) || _scope.isDeclared(prefix)) {
+  if (!prefix.isEmpty() && _scope.useAs(element, {prefix, URI})) return prefix;
+  if (prefix.isEmpty() || _scope.isTaken(element, prefix) || _scope.isDeclared(prefix)) {
     do {
       prefix = ascii(_madeTexts.emplace_back("ns" + std::to_string(_madeTexts.size() + 1)));
-    } while (isTaken(prefix) || _scope.isDeclared(prefix));
+    } while (_scope.isTaken(element, prefix) || _scope.isDeclared(prefix));
   }
   declare(element, {prefix, URI});
   return prefix;
 }
 
-bool Serializer::isTaken(NSStringView prefix) const {
-  for (const Declaration& declaration : _declared) {
-    if (declaration.prefix.equals(prefix)) return true;
-  }
-  for (const NSStringView used : _usedPrefixes) {
-    if (used.equals(prefix)) return true;
-  }
-  return false;
-}
-
 void Serializer::declareFor(const NSXMLElement* element) {
   _declared.clear();
-  _usedPrefixes.clear();
   _attributePrefixes.clear();
   declareOwn(element);
   if (element == _root) declareInherited(element);
   declareForName(element);
+  WorkPacer pacer;
   for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
        attribute = NSXMLElement::nextAttribute(attribute)) {
+    pacer.turn();
     // A name without a URI is written as it is.
     const bool isPlain = attribute->URIView().isEmpty();
-    const NSStringView prefix = isPlain ? NSStringView() : prefixForAttribute(element, attribute);
-    _attributePrefixes.push_back(prefix);
-    if (!isPlain && !_usedPrefixes.back().equals(prefix)) _usedPrefixes.push_back(prefix);
+    _attributePrefixes.push_back(isPlain ? NSStringView() : prefixForAttribute(element, attribute));
   }
 }
 

@@ -1,8 +1,10 @@
 #include "Platform/XMLTestSupport.h"
+#include "Platform/XMLTree.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
 
+#include <ctime>
 #include <string>
 
 namespace xquery {
@@ -181,6 +183,29 @@ TEST(XMLSerializer, AttributesWithClashingPrefixesGetFreeOnes) {
             "<p:a xmlns:p=\"u\" xmlns:ns1=\"v\" xmlns:ns2=\"w\" ns1:x=\"1\" ns1:y=\"2\" "
             "ns2:z=\"3\"><b xmlns:ns1=\"mine\" xmlns:ns3=\"v\" ns3:x=\"4\"/></p:a>");
   EXPECT_EQ(described(parsed(written(a.get()))->rootElement()), described(a.get()));
+}
+
+// Every attribute needs a declaration of its own. Comparing each with all others would take many
+// seconds.
+TEST(XMLSerializer, ManyAttributesOfManyNamespacesTakeLinearTime) {
+  constexpr int count = 20000;
+  std::string declarations;
+  std::string attributes;
+  const auto a = NSXMLElement::elementWithName(A("a"));
+  NSXMLNode* last = nullptr;
+  for (int index = 0; index < count; ++index) {
+    const std::string URI = "u" + std::to_string(index);
+    const std::string prefix = "p" + std::to_string(index);
+    const auto attribute = NSXMLNode::attributeWithName(A(prefix + ":x"), A(""), A(URI));
+    NSXMLTree::appendAttribute(a.get(), attribute.get(), last);
+    last = attribute.get();
+    declarations.append(" xmlns:").append(prefix).append("=\"").append(URI).append("\"");
+    attributes.append(" ").append(prefix).append(":x=\"\"");
+  }
+  const std::clock_t begin = std::clock();
+  const std::string text = written(a.get());
+  EXPECT_LT(static_cast<double>(std::clock() - begin) / CLOCKS_PER_SEC, 3);
+  EXPECT_EQ(text, "<a" + declarations + attributes + "/>");
 }
 
 // --- round trips -------------------------------------------------------------------------------
