@@ -102,18 +102,20 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
   void look(Request* request);
   void answer(Request& request);
   bool exceedsMemory() const;
+  LibXMLDocument copyOf(const NSXMLDocument& document, size_t mostLevels, const std::string& URL,
+                        xmlDictPtr dictionary = nullptr);
   Value result() const;
 
   const LibXSLTTask& _task;  // not for the thread of the transformation
   const NSXMLDocument::XSLTArguments _arguments;
   std::vector<const char*> _argumentTexts;  // name and value by turns, and null
+  std::atomic<int64_t> _bytes = 0;          // taken from libxml2 less those given back
   LibXMLDocument _document;
   LibXMLDocument _stylesheet;
   LibXMLDocument _result;
   bool _hasTextResult = false;
   std::string _failure;
   const char* _stackTop = nullptr;
-  std::atomic<int64_t> _bytes = 0;  // taken on the thread less those that it gave back
   std::atomic<bool> _nestsTooDeeply = false;
   std::shared_ptr<Transformation> _self;  // for the thread to take
 
@@ -131,6 +133,9 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
 
 // The transformation of this thread.
 thread_local Transformation* current = nullptr;
+
+// That which what this thread asks of libxml2 is for.
+thread_local Transformation* counted = nullptr;
 
 // Stands between libxml2 and malloc to count what transformations take. Texts grow by doubling as
 // easily as trees do, and nothing else tells how long they are. Nothing is refused here, since
@@ -159,17 +164,17 @@ class Counting {
 
   static void* malloc(size_t size) {
     void* const block = std::malloc(size);
-    if (current) current->noteBytes(sizeOf(block));
+    if (counted) counted->noteBytes(sizeOf(block));
     return block;
   }
   static void* realloc(void* block, size_t size) {
-    const int64_t before = current ? sizeOf(block) : 0;
+    const int64_t before = counted ? sizeOf(block) : 0;
     void* const moved = std::realloc(block, size);
-    if (current && moved) current->noteBytes(sizeOf(moved) - before);
+    if (counted && moved) counted->noteBytes(sizeOf(moved) - before);
     return moved;
   }
   static void free(void* block) {
-    if (current) current->noteBytes(-sizeOf(block));
+    if (counted) counted->noteBytes(-sizeOf(block));
     std::free(block);
   }
 };
@@ -256,13 +261,13 @@ void* Transformation::start(void* self) {
 
 void Transformation::work() {
   _stackTop = static_cast<const char*>(__builtin_frame_address(0));
-  current = this;
+  current = counted = this;
   // These three are of the thread and go with it.
   xmlSetStructuredErrorFunc(nullptr, hearStructuredError);
   xmlSetGenericErrorFunc(nullptr, hearError);
   xmlRegisterNodeDefaultValue = xquery::noteNode;
   if (const Stylesheet stylesheet = compile()) apply(*stylesheet);
-  current = nullptr;
+  current = counted = nullptr;
 }
 
 bool Transformation::finish() {
@@ -369,9 +374,8 @@ void Transformation::noteNode() {
 Transformation::Transformation(const LibXSLTTask& task)
     : _task(task),
       _arguments(task.arguments),
-      _document(LibXMLDocumentFrom(task.document, LibXSLTMostDocumentLevels, task.documentURL)),
-      _stylesheet(
-          LibXMLDocumentFrom(task.stylesheet, LibXSLTMostStylesheetLevels, task.stylesheetURL)) {
+      _document(copyOf(task.document, LibXSLTMostDocumentLevels, task.documentURL)),
+      _stylesheet(copyOf(task.stylesheet, LibXSLTMostStylesheetLevels, task.stylesheetURL)) {
   for (const auto& [name, value] : _arguments) {
     _argumentTexts.push_back(name.c_str());
     _argumentTexts.push_back(value.c_str());
@@ -446,7 +450,17 @@ void Transformation::answer(Request& request) {
   if (!document) return;
   const size_t mostLevels =
       request.isStylesheet ? LibXSLTMostStylesheetLevels : LibXSLTMostDocumentLevels;
-  request.document = LibXMLDocumentFrom(*document, mostLevels, request.URL, request.dictionary);
+  request.document = copyOf(*document, mostLevels, request.URL, request.dictionary);
+}
+
+LibXMLDocument Transformation::copyOf(const NSXMLDocument& document, size_t mostLevels,
+                                      const std::string& URL, xmlDictPtr dictionary) {
+  struct Counted {
+    explicit Counted(Transformation* transformation) { counted = transformation; }
+    ~Counted() { counted = nullptr; }
+  };
+  const Counted counting(this);
+  return LibXMLDocumentFrom(document, mostLevels, URL, dictionary);
 }
 
 Value Transformation::result() const {

@@ -169,5 +169,35 @@ TEST(XSLT, TextsCountAsMemory) {
   }
 }
 
+TEST(XSLT, LoadedDocumentsCountAsMemory) {
+  class Loader : public XQueryLoader {
+   public:
+    std::optional<XQueryResource> load(const NSURL&, XQueryLoadPurpose) override {
+      std::string text = "<d>";
+      for (int index = 0; index < 50000; ++index) text += "<x/>";
+      return XQueryResource{text + "</d>", {}, {}, {}};
+    }
+  };
+  const auto loading = [](int documents) {
+    return stylesheet(
+        "<xsl:template match='/'><r><xsl:call-template name='t'/></r></xsl:template>"
+        "<xsl:template name='t'><xsl:param name='n' select='" +
+        std::to_string(documents) +
+        "'/><xsl:if test='$n'><xsl:value-of select=\"count(document(concat('http://h/', $n)))\"/>"
+        "<xsl:call-template name='t'><xsl:with-param name='n' select='$n - 1'/>"
+        "</xsl:call-template></xsl:if></xsl:template>");
+  };
+  Settings settings;
+  XQueryLoading loader;
+  loader.loader = std::make_shared<Loader>();
+  settings.context->contextSetLoading(loader);
+  XQueryLimits limits;
+  limits.memoryCeiling = uint64_t{48} << 20;
+  settings.context->contextSetLimits(limits);
+  EXPECT_EQ(settings.answer("string(ext:xslt(/, $s))", loading(2)), "(string 11)");
+  EXPECT_EQ(settings.answer("string(ext:xslt(/, $s))", loading(20)),
+            "error 0 limit: memory ceiling reached");
+}
+
 }  // namespace
 }  // namespace xquery
