@@ -100,10 +100,10 @@ Value fn_ends_with(const Value* arguments, size_t count, XQueryContext& context)
 
 Value fn_substring(const Value* arguments, size_t count, XQueryContext& context) {
   if (count < 2 || count > 3) return Value();
-  const Value source = XQueryPromoteToString(arguments[0], context);
+  const XQueryTextArgument source(arguments[0], context);
   const Value start = XQueryPromoteToNumeric(arguments[1], context);
   const Value length = count == 3 ? XQueryPromoteToNumeric(arguments[2], context) : Value();
-  const NSStringView text = cast<NSString>(source)->view();
+  const NSStringView text = source.view();
   const std::optional<int64_t> from = roundedPosition(start, context);
   // From minus infinity nothing can be reached, however long the part is.
   if (!from || *from > text.length() || (*from < 0 && isInfinite(start))) {
@@ -117,7 +117,7 @@ Value fn_substring(const Value* arguments, size_t count, XQueryContext& context)
   }
   const UnitRange range = rangeOfSubstring(text.length(), *from, units);
   // To its end the whole source is answered as it is; a part of given length is an xs:string.
-  if (!units && range.count == text.length()) return source;
+  if (!units && range.count == text.length()) return XQueryPromoteToString(arguments[0], context);
   return XQueryString::stringWithView(text.substring(range.from, range.count));
 }
 
