@@ -1,6 +1,8 @@
 #include "Functions/XQueryValueSet.h"
 
+#include "Types/XQueryQName.h"
 #include "Types/XQueryValues.h"
+#include "xquery/Date.h"
 
 #include <bit>
 #include <cmath>
@@ -16,25 +18,60 @@ uint64_t keyOf(double value) {
   return std::bit_cast<uint64_t>(value == 0 ? 0.0 : value);
 }
 
+Kind familyOf(const NSObject& value) {
+  return isa<NSDate>(&value) ? Kind::Date : value.kind();
+}
+
+// No namespace comes before all others.
+int orderOf(const Ref<NSString>& a, const Ref<NSString>& b) {
+  if (!a || !b) return (a ? 1 : 0) - (b ? 1 : 0);
+  return a->view().compare(b->view());
+}
+
+bool isOrderedBefore(const XQueryQName& a, const XQueryQName& b) {
+  const int order = orderOf(a.localPart(), b.localPart());
+  return order != 0 ? order < 0 : orderOf(a.namespaceURI(), b.namespaceURI()) < 0;
+}
+
 }  // namespace
+
+bool XQueryIsOrderedBefore(const NSObject& a, const NSObject& b) {
+  const Kind family = familyOf(a);
+  if (family != familyOf(b)) return family < familyOf(b);
+  switch (family) {
+    case Kind::Date:
+      return cast<NSDate>(&a)->instant() < cast<NSDate>(&b)->instant();
+    case Kind::QName:
+      return isOrderedBefore(*cast<XQueryQName>(&a), *cast<XQueryQName>(&b));
+    case Kind::URL:
+    case Kind::Notation:
+    case Kind::HexBinary:
+    case Kind::Base64Binary:
+      return orderOf(XQueryStringValue(a), XQueryStringValue(b)) < 0;
+    default:
+      return std::less<>()(&a, &b);
+  }
+}
+
+uint64_t XQueryOtherValueHash::operator()(const NSObject* value) const {
+  const uint64_t hash = XQueryObjectHash(*value);
+  const auto* name = dyn_cast<XQueryQName>(value);
+  return name && name->namespaceURI() ? hash << 32 | name->namespaceURI()->hash() : hash;
+}
 
 uint64_t XQueryValueSet::ExactHash::operator()(const NSDecimal& value) const {
   if (value.isSmallInteger()) return static_cast<uint64_t>(value.smallInteger());
   return std::hash<std::string>()(value.toString());
 }
 
-size_t XQueryValueSet::ValueHash::operator()(const NSObject* value) const {
-  return XQueryObjectHash(*value);
-}
-
-bool XQueryValueSet::ValueEqual::operator()(const NSObject* a, const NSObject* b) const {
+bool XQueryValueSet::ObjectEqual::operator()(const NSObject* a, const NSObject* b) const {
   return XQueryObjectsEqual(*a, *b);
 }
 
 bool XQueryValueSet::insert(const NSObject& value) {
   if (const auto* string = dyn_cast<NSString>(&value)) return _strings.insert(string->view());
   if (const auto* number = dyn_cast<NSNumber>(&value)) return insertNumber(*number);
-  return _others.insert(&value).second;
+  return _others.insert(&value);
 }
 
 bool XQueryValueSet::insertNumber(const NSNumber& number) {

@@ -12,8 +12,9 @@
 //                too.
 //   others       every other class, equal only within itself
 //
-// Hashing exact numbers by their digits, not as doubles, also keeps a million integers that share
-// one double from landing in one bucket.
+// No choice of values makes it slow. Hashing exact numbers by their digits, not as doubles, keeps
+// a million integers that share one double apart, as hashing QNames by their namespaces too does
+// for a million of one local part; and each part has an order to fall back on.
 #pragma once
 
 #include "Functions/FlatSet.h"
@@ -24,9 +25,16 @@
 #include <cstddef>
 #include <cstdint>
 #include <functional>
-#include <unordered_set>
 
 namespace xquery {
+
+// An order of the atomic values that are neither texts nor numbers, in which only equal ones are
+// neither less nor greater.
+bool XQueryIsOrderedBefore(const NSObject& a, const NSObject& b);
+
+struct XQueryOtherValueHash {
+  uint64_t operator()(const NSObject* value) const;
+};
 
 class XQueryValueSet {
  public:
@@ -52,11 +60,13 @@ class XQueryValueSet {
   struct BitsHash {
     uint64_t operator()(uint64_t bits) const { return bits; }
   };
-  struct ValueHash {
-    size_t operator()(const NSObject* value) const;
-  };
-  struct ValueEqual {
+  struct ObjectEqual {
     bool operator()(const NSObject* a, const NSObject* b) const;
+  };
+  struct ObjectLess {
+    bool operator()(const NSObject* a, const NSObject* b) const {
+      return XQueryIsOrderedBefore(*a, *b);
+    }
   };
 
   bool insertNumber(const NSNumber& number);
@@ -69,8 +79,7 @@ class XQueryValueSet {
   FlatSet<NSDecimal, ExactHash, ExactEqual, ExactLess> _exact;
   BitsSet _floating;      // doubles by their bits
   BitsSet _exactDoubles;  // complete once `_floating` holds anything
-  std::unordered_set<const NSObject*, ValueHash, ValueEqual, ValueAllocator<const NSObject*>>
-      _others;
+  FlatSet<const NSObject*, XQueryOtherValueHash, ObjectEqual, ObjectLess> _others;
 };
 
 }  // namespace xquery

@@ -1,8 +1,11 @@
 #include "Functions/FunctionsTesting.h"
 #include "Functions/XQueryValueSet.h"
 #include "Platform/ProcessorTime.h"
+#include "Types/XQueryDate.h"
 
+#include <cstdlib>
 #include <random>
+#include <set>
 
 namespace xquery {
 namespace {
@@ -106,6 +109,91 @@ TEST(ValueSet, TheAnswerDependsOnTheOrderWhereEqualityDoes) {
   EXPECT_TRUE(floatingFirst.insert(*floating));
   EXPECT_FALSE(floatingFirst.insert(*low));
   EXPECT_FALSE(floatingFirst.insert(*exact));
+}
+
+// The values that are neither texts nor numbers.
+std::vector<Value> otherValues() {
+  std::vector<Value> values;
+  for (const Value& value : somewhatAlike()) {
+    if (!isa<NSString>(value) && !isa<NSNumber>(value)) values.push_back(value);
+  }
+  for (const char* name : {"a", "b", "p:a"}) {
+    for (const char* URI : {"urn:1", "urn:2"}) {
+      values.push_back(
+          XQueryQName::qname(NSString::stringWithASCII(name), NSString::stringWithASCII(URI)));
+    }
+    values.push_back(typed(XQueryTypeNotation, name));
+    values.push_back(typed(XQueryTypeAnyURI, name));
+  }
+  values.push_back(NSDate::dateWithTimeIntervalSinceReferenceDate(0));
+  values.push_back(typed(XQueryTypeDateTime, "2001-01-01T00:00:00Z"));
+  return values;
+}
+
+TEST(ValueOrder, OfTwoValuesOneIsLessUnlessTheyAreEqual) {
+  const std::vector<Value> values = otherValues();
+  size_t equalPairs = 0;
+  for (const Value& a : values) {
+    for (const Value& b : values) {
+      const bool equal = XQueryObjectsEqual(*a, *b);
+      EXPECT_EQ(XQueryIsOrderedBefore(*a, *b) + XQueryIsOrderedBefore(*b, *a), equal ? 0 : 1)
+          << show(a) << " and " << show(b);
+      equalPairs += equal && a != b;
+    }
+  }
+  EXPECT_GT(equalPairs, 10U);
+}
+
+TEST(ValueOrder, IsAnOrder) {
+  const std::vector<Value> values = otherValues();
+  for (const Value& a : values) {
+    for (const Value& b : values) {
+      if (!XQueryIsOrderedBefore(*a, *b)) continue;
+      for (const Value& c : values) {
+        if (!XQueryIsOrderedBefore(*b, *c)) continue;
+        EXPECT_TRUE(XQueryIsOrderedBefore(*a, *c)) << show(a) << show(b) << show(c);
+      }
+    }
+  }
+}
+
+// A QName's own hash is that of its local part.
+TEST(ValueSet, NamesOfOneLocalPartAreSpreadByTheirNamespaces) {
+  const Ref<NSString> local = NSString::stringWithASCII("a");
+  std::set<uint64_t> hashes;
+  for (int index = 0; index < 1000; ++index) {
+    const Ref<NSString> URI = NSString::stringWithASCII("urn:" + std::to_string(index));
+    const Ref<XQueryQName> name = XQueryQName::qnameWithLocalPart(local, URI);
+    hashes.insert(XQueryOtherValueHash()(name.get()));
+    const Ref<NSString> same = NSString::stringWithASCII("urn:" + std::to_string(index));
+    EXPECT_EQ(
+        XQueryOtherValueHash()(name.get()),
+        XQueryOtherValueHash()(XQueryQName::qname(NSString::stringWithASCII("p:a"), same).get()));
+  }
+  EXPECT_GT(hashes.size(), 990U);
+}
+
+// Dates made so that all have one hash, which sends most of them into the ordered part of the set.
+TEST(ValueSet, DatesOfOneHashAreToldApart) {
+  constexpr uint64_t factor = 0x9E3779B97F4A7C15U;
+  uint64_t inverse = factor;
+  for (int step = 0; step < 6; ++step) inverse *= 2 - factor * inverse;
+  std::vector<Value> dates;
+  for (uint64_t half = 1; dates.size() < 3000; ++half) {
+    const auto seconds = static_cast<int64_t>((half << 32 | half) * inverse);
+    if (std::abs(seconds) > int64_t{1} << 55) continue;
+    dates.push_back(
+        XQueryDate::xqueryDateWithInstant({seconds, 0}, Ref<NSTimeZone>(), XQueryTypeDateTime));
+    ASSERT_EQ(XQueryObjectHash(*dates.back()), 0U);
+  }
+  XQueryValueSet set;
+  for (const Value& date : dates) EXPECT_TRUE(set.insert(*date));
+  for (const Value& date : dates) {
+    const XQueryDate& one = *cast<XQueryDate>(date);
+    const Value copy =
+        XQueryDate::xqueryDateWithInstant(one.instant(), NSTimeZone::GMT(), XQueryTypeDate);
+    EXPECT_FALSE(set.insert(*copy));
+  }
 }
 
 // Numbers that share one double must not make each insertion look at all the others.
