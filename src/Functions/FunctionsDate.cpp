@@ -10,9 +10,14 @@
 namespace xquery {
 namespace {
 
+// Of a value with a zone.
+int32_t offsetOf(const XQueryDate& date) {
+  return date.timeZone()->secondsFromGMT(date.instant());
+}
+
 Value timezoneOf(const XQueryDate& date) {
   if (!date.timeZone()) return NSNull::null();
-  return XQueryNumber::dayTimeDurationWithSeconds(date.timeZone()->secondsFromGMT(date.instant()));
+  return XQueryNumber::dayTimeDurationWithSeconds(offsetOf(date));
 }
 
 Value fieldOf(const XQueryDate& date, XQueryDateField field) {
@@ -50,10 +55,6 @@ struct DatePair {
   }
 };
 
-int32_t offsetOf(const XQueryDate& date) {
-  return date.timeZone()->secondsFromGMT(date.instant());
-}
-
 }  // namespace
 
 Value XQueryDateComponent(XQueryTypeID type, XQueryDateField field, const Value* arguments,
@@ -64,11 +65,6 @@ Value XQueryDateComponent(XQueryTypeID type, XQueryDateField field, const Value*
   // The failed cast of a URI travels on.
   const auto* date = dyn_cast<XQueryDate>(value);
   return date ? fieldOf(*date, field) : value;
-}
-
-Value XQueryDateInTimezone(XQueryTypeID type, const Value* arguments, size_t count,
-                           XQueryContext& context) {
-  return adjust_dateTime_to_timezone(arguments, count, context, type);
 }
 
 Value XQueryDateDifference(XQueryTypeID type, const Value* arguments, size_t count,
@@ -90,12 +86,12 @@ Value fn_dateTime(const Value* arguments, size_t count, XQueryContext& context) 
   if (pair.failure) return pair.failure;
   const XQueryDate& date = *cast<XQueryDate>(pair.first);
   const XQueryDate& time = *cast<XQueryDate>(pair.second);
+  if (date.timeZone() && time.timeZone() && offsetOf(date) != offsetOf(time)) return Value();
   NSGregorianDate fields = date.gregorianDate();
   const NSGregorianDate clock = time.gregorianDate();
   fields.hour = clock.hour;
   fields.minute = clock.minute;
   fields.second = clock.second;
-  if (date.timeZone() && time.timeZone() && offsetOf(date) != offsetOf(time)) return Value();
   const XQueryDate& zoned = date.timeZone() ? date : time;
   return XQueryDate::xqueryDateWithGregorianDate(fields, zoned.timeZoneForFields(fields),
                                                  XQueryTypeDateTime);

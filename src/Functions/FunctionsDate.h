@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Functions/XQueryBuiltInFunction.h"
+#include "Types/XQueryDateArithmetic.h"
 #include "Types/XQueryTypeTable.h"
 
 namespace xquery {
@@ -13,9 +14,6 @@ enum class XQueryDateField : uint8_t { Year, Month, Day, Hours, Minutes, Seconds
 // empty, and so is the zone of a value without one.
 Value XQueryDateComponent(XQueryTypeID type, XQueryDateField field, const Value* arguments,
                           size_t count, XQueryContext& context);
-// In the implicit zone, or in that of the second argument.
-Value XQueryDateInTimezone(XQueryTypeID type, const Value* arguments, size_t count,
-                           XQueryContext& context);
 // Of two values: the first instant minus the second, as a dayTimeDuration.
 Value XQueryDateDifference(XQueryTypeID type, const Value* arguments, size_t count,
                            XQueryContext& context);
@@ -33,7 +31,7 @@ Value XQueryDateAccessor(const Value* arguments, size_t count, XQueryContext& co
 
 template <XQueryTypeID type>
 Value XQueryDateAdjustment(const Value* arguments, size_t count, XQueryContext& context) {
-  return XQueryDateInTimezone(type, arguments, count, context);
+  return adjust_dateTime_to_timezone(arguments, count, context, type);
 }
 
 template <XQueryTypeID type>

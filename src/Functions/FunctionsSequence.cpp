@@ -49,21 +49,21 @@ Value sequenceOf(Items items) {
   return NSArray::arrayWithObjects(std::move(items));
 }
 
-// False for the empty sequence, which is no position.
-bool readPosition(const Value& argument, int64_t& position, XQueryContext& context) {
-  const Value integer = XQueryPromoteToInteger(argument, context);
-  if (isNull(integer)) return false;
-  position = cast<NSNumber>(integer)->integerValue();
-  return true;
-}
-
-// The same of a number of any type, rounded to a whole one: NaN is 0, and an infinity the farthest
-// position.
-bool readRounded(const Value& argument, int64_t& position, XQueryContext& context) {
-  const Value number = xqround(XQueryPromoteToNumeric(argument, context), 0, false, context);
+// Reads the whole part, saturated: NaN is 0, and an infinity the farthest position. False for the
+// empty sequence, which is no position.
+bool readPosition(const Value& number, int64_t& position) {
   if (isNull(number)) return false;
   position = cast<NSNumber>(number)->integerValue();
   return true;
+}
+
+bool readInteger(const Value& argument, int64_t& position, XQueryContext& context) {
+  return readPosition(XQueryPromoteToInteger(argument, context), position);
+}
+
+bool readRounded(const Value& argument, int64_t& position, XQueryContext& context) {
+  const Value number = XQueryPromoteToNumeric(argument, context);
+  return readPosition(xqround(number, 0, false, context), position);
 }
 
 }  // namespace
@@ -150,7 +150,7 @@ Value fn_distinct_values(const Value* arguments, size_t count, XQueryContext& co
 
 Value fn_insert_before(const Value* arguments, size_t count, XQueryContext& context) {
   int64_t position = 0;
-  if (count != 3 || !readPosition(arguments[1], position, context)) return Value();
+  if (count != 3 || !readInteger(arguments[1], position, context)) return Value();
   const XQueryItemList target(arguments[0].get());
   const XQueryItemList inserted(arguments[2].get());
   const auto end = static_cast<int64_t>(target.count()) + 1;
@@ -166,7 +166,7 @@ Value fn_insert_before(const Value* arguments, size_t count, XQueryContext& cont
 // Answers a sequence whatever is left, be it one item or none.
 Value fn_remove(const Value* arguments, size_t count, XQueryContext& context) {
   int64_t position = 0;
-  if (count != 2 || !readPosition(arguments[1], position, context)) return Value();
+  if (count != 2 || !readInteger(arguments[1], position, context)) return Value();
   const XQueryItemList target(arguments[0].get());
   const size_t length = target.count();
   const bool isInside = position >= 1 && static_cast<uint64_t>(position) <= length;
