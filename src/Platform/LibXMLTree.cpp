@@ -1,5 +1,6 @@
 #include "Platform/LibXMLTree.h"
 
+#include "Platform/UTF8.h"
 #include "Platform/WorkMeter.h"
 #include "Platform/XMLNames.h"
 #include "Platform/XMLTreeBuilder.h"
@@ -279,13 +280,6 @@ xmlNs* Exporter::namespaceFor(xmlNode* element, const ExportedName& name, bool i
 
 std::string_view viewOf(const xmlChar* text) {
   return text ? std::string_view(reinterpret_cast<const char*>(text)) : std::string_view();
-}
-
-bool isASCII(std::string_view text) {
-  for (const char unit : text) {
-    if (static_cast<unsigned char>(unit) >= 0x80) return false;
-  }
-  return true;
 }
 
 bool isText(const xmlNode* node) {

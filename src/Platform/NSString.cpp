@@ -27,22 +27,6 @@ const void* unitsOf(NSStringView text) {
   return text.isWide() ? static_cast<const void*>(text.wideUnits()) : text.asciiUnits();
 }
 
-bool isASCII(std::u16string_view text) {
-  char16_t all = 0;
-  for (const char16_t unit : text) all |= unit;
-  return all < 0x80;
-}
-
-bool isASCII(std::string_view text) {
-  unsigned char all = 0;
-  for (const char unit : text) all |= static_cast<unsigned char>(unit);
-  return all < 0x80;
-}
-
-bool isNarrow(NSStringView text) {
-  return !text.isWide() || isASCII(std::u16string_view(text.wideUnits(), text.length()));
-}
-
 // A length that 32 bits do not hold is as good as memory that is not there.
 uint32_t checkedLength(size_t length) {
   if (length >= NSStringView::notFound) throw std::bad_alloc();

@@ -10,6 +10,7 @@
 #include "Platform/PCRE.h"
 
 #include "Platform/PCREClassicSyntax.h"
+#include "Platform/UTF8.h"
 #include "Platform/WorkMeter.h"
 
 #include <pcre2.h>
@@ -177,12 +178,6 @@ class Compiler {
   int _error = 0;
   size_t _offset = 0;
 };
-
-bool isASCII(std::string_view text) {
-  unsigned char all = 0;
-  for (const char unit : text) all |= static_cast<unsigned char>(unit);
-  return all < 0x80;
-}
 
 double threadSeconds() {
   timespec time = {};

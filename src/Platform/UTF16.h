@@ -5,9 +5,17 @@
 #include "Platform/WorkMeter.h"
 #include "xquery/String.h"
 
+#include <algorithm>
 #include <string_view>
 
 namespace xquery {
+
+// Whether 8-bit units can hold the text.
+inline bool isNarrow(NSStringView text) {
+  if (!text.isWide()) return true;
+  const std::u16string_view units(text.wideUnits(), text.length());
+  return std::all_of(units.begin(), units.end(), [](char16_t unit) { return unit < 0x80; });
+}
 
 constexpr bool isHighSurrogate(char32_t unit) {
   return unit >= 0xD800 && unit < 0xDC00;

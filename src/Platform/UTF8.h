@@ -3,8 +3,22 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
+#include <string_view>
 
 namespace xquery {
+
+inline bool isASCII(std::string_view text) {
+  uint64_t bits = 0;
+  size_t at = 0;
+  for (; at + sizeof bits <= text.size(); at += sizeof bits) {
+    uint64_t word = 0;
+    std::memcpy(&word, text.data() + at, sizeof word);
+    bits |= word;
+  }
+  for (; at < text.size(); ++at) bits |= static_cast<unsigned char>(text[at]);
+  return (bits & 0x8080808080808080ULL) == 0;
+}
 
 constexpr char32_t invalidCodePoint = UINT32_MAX;
 

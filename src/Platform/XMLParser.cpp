@@ -29,18 +29,6 @@ constexpr std::string_view whiteSpace = " \t\r\n";
 constexpr size_t mostUnits = std::numeric_limits<uint32_t>::max() - 1;
 constexpr const char* tooLong = "a text is too long";
 
-bool isASCII(std::string_view text) {
-  uint64_t bits = 0;
-  size_t at = 0;
-  for (; at + sizeof bits <= text.size(); at += sizeof bits) {
-    uint64_t word = 0;
-    std::memcpy(&word, text.data() + at, sizeof word);
-    bits |= word;
-  }
-  for (; at < text.size(); ++at) bits |= static_cast<unsigned char>(text[at]);
-  return (bits & 0x8080808080808080ULL) == 0;
-}
-
 // libxml2 hands out well-formed UTF-8 only: every byte but a continuation begins a unit, and a
 // first byte of a four-byte form another.
 size_t unitCount(std::string_view text) {

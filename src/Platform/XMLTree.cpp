@@ -1,5 +1,6 @@
 #include "Platform/XMLTree.h"
 
+#include "Platform/UTF16.h"
 #include "Platform/WorkMeter.h"
 #include "Platform/XMLNames.h"
 #include "Platform/XMLTreeExtra.h"
@@ -44,12 +45,6 @@ constexpr size_t roundedUp(size_t value, size_t unit) {
 
 size_t bytesOf(NSStringView text) {
   return size_t{text.length()} * (text.isWide() ? sizeof(char16_t) : 1);
-}
-
-bool isNarrow(NSStringView text) {
-  if (!text.isWide()) return true;
-  const char16_t* units = text.wideUnits();
-  return std::all_of(units, units + text.length(), [](char16_t unit) { return unit < 0x80; });
 }
 
 // The text copied to `memory`, which has room for it.
