@@ -7,6 +7,10 @@
 // thread does, and loads what the stylesheet names, so that loaders and limits belong to one thread
 // as everywhere else.
 //
+// What libxml2 asks of malloc for a transformation, the copies included, counts as memory of the
+// evaluation. It is looked at by the calling thread every few milliseconds, so that a text that
+// doubles may exceed the ceiling a few times over before the transformation is stopped.
+//
 // Most of libxslt can be told to stop. What cannot, such as compiling a large stylesheet, which
 // takes quadratic time, is left behind when an evaluation ends meanwhile: its thread, which shares
 // nothing with anybody, works on until it is done. A few such threads at most are suffered at a
