@@ -296,8 +296,7 @@ TEST(Eval, CompilesFromSeveralThreadsAtOnce) {
   EXPECT_EQ(right, 200);
 }
 
-// --- node-xquery, node-xpath, _test
-// ----------------------------------------------------------------
+// --- node-xquery, node-xpath, _test --------------------------------------------------------------
 
 TEST(NodeXQuery, EvaluatesAgainstTheNode) {
   const Value doc = document("<a><b>1</b><b>2</b></a>");
@@ -360,8 +359,7 @@ TEST(RealDateTime, IsOfTheMomentOfTheCall) {
   EXPECT_EQ(refusedCounts(ext_real_date_time, integer(1)), "1 2 3 4 5");
 }
 
-// --- uri-body
-// --------------------------------------------------------------------------------------
+// --- uri-body ------------------------------------------------------------------------------------
 
 TEST(URIBody, GivesTheBytes) {
   const TestFolder folder;

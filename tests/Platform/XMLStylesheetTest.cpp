@@ -559,7 +559,7 @@ TEST(XMLStylesheetDeathTest, TheProcessEndsInOrderWhileOneIsLeftBehind) {
   GTEST_FLAG_SET(death_test_style, "threadsafe");
   const auto leaveAndEnd = [] {
     const auto doc = document("<a/>");
-    const std::string style = slowToCompile(7000);
+    const std::string style = slowToCompile(10000);
     try {
       const Deadline deadline(10);
       applied(*doc, style);
