@@ -1,5 +1,6 @@
 // The declarations of a prolog: their tables, the import of those of library modules, the numbering
 // of local variables, and the binding pass over the declarations.
+#include "Platform/WorkMeter.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
@@ -64,12 +65,17 @@ void XQueryProlog::restoreLocalScope(const LocalScope& scope) {
 // Copies what the module declared in its own namespace, and nothing that it imported itself. A
 // module that imports itself finds each of its names taken, so the walk never sees its own growth.
 void XQueryProlog::_importDeclarations(const XQueryProlog& module) {
+  // Each name of each import may be an error: of two short texts more than any memory holds.
+  constexpr size_t mostErrors = 100'000;
   if (!module.isModule()) return;
   const int64_t moduleID = module.namespaceIDForPrefix(module._modulePrefix->view());
   const auto isOwn = [&](const XQueryQName& name) {
     return module.namespaceID(name.namespaceURI()) == moduleID;
   };
+  WorkPacer pacer;
   for (size_t index = 0; index < module._declarations.size(); ++index) {
+    if (_errors.size() >= mostErrors) return;
+    pacer.turn();
     const Value declaration = module._declarations[index];
     if (auto* variable = dyn_cast<XQueryVarDecl>(declaration)) {
       const auto& name = variable->name();

@@ -189,6 +189,38 @@ TEST_F(LimitWatch, ImportingAModuleFromASlowServerEndsAtTheLimit) {
                          limitstest::mostWait);
 }
 
+TEST_F(LimitWatch, ImportingAModuleManyTimesEndsAtTheLimit) {
+  class Modules : public XQueryLoader {
+   public:
+    std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose) override {
+      if (URL.absoluteString()->utf8() == "app:outer") {
+        return XQueryResource{
+            "module namespace o = 'urn:o'; import module 'urn:i' at 'app:inner';", {}, {}, {}};
+      }
+      std::string text = "module namespace i = 'urn:i';";
+      for (int i = 0; i < 10000; ++i) text += "declare variable $i:v" + std::to_string(i) + ":=1;";
+      return XQueryResource{text, {}, {}, {}};
+    }
+  };
+  XQueryLoading loading;
+  loading.policy = XQueryLoadingPolicy::denyAll().allowScheme("app");
+  loading.loader = std::make_shared<Modules>();
+  // None of the many declarations that the module has imported is taken over.
+  std::string query;
+  for (int i = 0; i < 10000; ++i) query += "import module 'urn:o' at 'app:outer';";
+  constexpr milliseconds duration(1000);
+  outerLimits.duration = duration;
+  const auto importing = [&] {
+    const auto start = limitstest::processorTime(CLOCK_THREAD_CPUTIME_ID);
+    Outcome outer = evaluateOuter(
+        [&](XQueryContext&) { static_cast<void>(XQuery::xqueryWithSource(query + "1", loading)); });
+    outer.lateProcessor = limitstest::processorTime(CLOCK_THREAD_CPUTIME_ID) - start - duration;
+    return outer;
+  };
+  limitstest::expectSoon(importing, "limit: deadline passed", &Outcome::lateProcessor,
+                         limitstest::mostLate);
+}
+
 TEST_F(LimitWatch, ANestedContextLoadsByTheRulesOfTheOuterOneAndSharesNothingElse) {
   class Loader : public XQueryLoader {
    public:

@@ -129,6 +129,22 @@ TEST_F(ModuleImport, ASecondImportFindsEveryNameTaken) {
   EXPECT_EQ(failure().substr(0, 35), "37 duplicate definition of variable");
 }
 
+TEST_F(ModuleImport, ErrorsOfManyImportsOfManyNamesAreReportedUpToABound) {
+  std::string declarations = "module namespace m = 'urn:m';";
+  for (int i = 0; i < 400; ++i) {
+    declarations += " declare variable $m:v" + std::to_string(i) + " := 1;";
+  }
+  const std::string import = "import module 'urn:m' at " + module("m.xq", declarations) + "; ";
+  const auto errorsOf = [&](int imports) {
+    std::string source;
+    for (int i = 0; i < imports; ++i) source += import;
+    return numbers(source + "1").size();
+  };
+  EXPECT_EQ(errorsOf(1 + 250), 100'000U);
+  EXPECT_EQ(errorsOf(1 + 249), 99'600U);
+  EXPECT_EQ(errorsOf(1 + 500), 100'000U);
+}
+
 TEST_F(ModuleImport, ModulesMayImportEachOther) {
   module("a.xq", "module namespace a = 'urn:a'; import module namespace b = 'urn:b' at " +
                      location("b.xq") + "; declare variable $a:x := 1;");
