@@ -22,8 +22,9 @@ namespace {
 // Joins whose items depend on more variables are left alone.
 constexpr size_t mostVariables = 6;
 
-// Evaluates what the plain way may not have come to evaluate yet: null for an error, which leaves
-// nothing behind.
+// Evaluates what the plain way may not have come to evaluate yet, and may never: null for an error,
+// which leaves nothing behind. That goes for limits as well, such as a range of too many items; one
+// that ends the whole evaluation is reached again at the next look at the work.
 Value valueOrNull(const XQueryExpr& expr, XQueryContext& context) {
   auto& dynamic = context._internal();
   const Value item = dynamic.contextItem();
@@ -33,7 +34,6 @@ Value valueOrNull(const XQueryExpr& expr, XQueryContext& context) {
   try {
     return expr.evaluateWithContext(context);
   } catch (const NSException&) {
-    if (XQueryIsLimit(dynamic.error().get())) throw;
     dynamic.setError(error, false);
     dynamic.setContextItem(item, position);
     dynamic.setLast(last);

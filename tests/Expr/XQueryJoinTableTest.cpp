@@ -78,8 +78,9 @@ TEST(JoinTable, ItemsOfThousandsOfKeysMakeNone) {
   constexpr size_t most = XQueryJoinTable::keysOfAnyItems;
   EXPECT_TRUE(isComplete(1, most));
   EXPECT_FALSE(isComplete(1, most + 1));
-  EXPECT_TRUE(isComplete(most / 16, 32));
-  EXPECT_FALSE(isComplete(most / 16, 33));
+  constexpr size_t items = most / XQueryJoinTable::mostKeysPerItem + 1;
+  EXPECT_TRUE(isComplete(items, XQueryJoinTable::mostKeysPerItem));
+  EXPECT_FALSE(isComplete(items, XQueryJoinTable::mostKeysPerItem + 1));
 }
 
 TEST(JoinTable, UntypedKeysMeetNumbersAsNumbersAndOthersAreAsked) {

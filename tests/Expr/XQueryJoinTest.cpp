@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <memory>
 #include <optional>
 #include <random>
@@ -399,6 +400,36 @@ TEST(Join, RangesAreNotListed) {
                    " return 1)",
                    document),
             answer("9, 9, 9, 9"));
+}
+
+TEST(Join, LimitsOfAKeyComeUpWhereTheyAlwaysDo) {
+  const Value document = parsed(twoLists);
+  const std::string tooMany = "count(1 to $x/@n * 1000000000000)";
+  for (const std::string& where :
+       {"$p = 2 and " + tooMany + " = $p", tooMany + " = $p", "$p > 1 and " + tooMany + " = $p",
+        "$x/@n > $p and $x/@n = 0 and " + tooMany + " = 1"}) {
+    expectAsPlain("for $p in (1, 1, 2) return ", "for $x in //i", where + " return 1", document);
+  }
+  const std::string filtered =
+      "for $p in (1, 1, 1) return //i[$p = 2 and count(1 to @n * 1000000000000) = $p]";
+  EXPECT_EQ(answer(filtered, document), answer(filtered + "[true()]", document));
+}
+
+// A deadline is no error of a key.
+TEST(Join, ALimitOfTheEvaluationEndsTheMakingOfATable) {
+  std::string text = "<r>";
+  for (int i = 0; i < 100; ++i) text += "<i k='1'/>";
+  const auto compiled = XQuery::xqueryWithSource(
+      "for $p in (1, 2) return count(for $x in //i"
+      " where $p = 2 and sum(1 to 100000) + $x/@k = $p return 1)");
+  const auto context = XQueryContext::xqueryContext();
+  XQueryLimits limits;
+  limits.duration = std::chrono::milliseconds(1);
+  context->contextSetLimits(limits);
+  Ref<XQueryError> error;
+  EXPECT_FALSE(context->evaluateXQuery(*compiled, {}, parsed(text + "</r>"), &error));
+  ASSERT_TRUE(error);
+  EXPECT_EQ(error->msg()->utf8(), "limit: deadline passed");
 }
 
 // The error, or the first item, where values may take a quarter of a megabyte.
