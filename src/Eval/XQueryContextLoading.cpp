@@ -1,5 +1,6 @@
 // The documents and raw bodies of one context.
 #include "Eval/XQueryContextInternal.h"
+#include "Platform/ASCII.h"
 #include "Platform/WorkMeter.h"
 #include "xquery/XMLNode.h"
 
@@ -12,13 +13,6 @@ namespace {
 constexpr uint32_t XMLOptions = NSXMLNodePreserveEmptyElements | NSXMLNodePreserveCDATA;
 constexpr uint32_t HTMLOptions = XMLOptions | NSXMLDocumentTidyHTML;
 static_assert(XMLOptions == 0x1000006 && HTMLOptions == 0x1000206);
-
-std::string lowerCase(std::string text) {
-  for (char& letter : text) {
-    if (letter >= 'A' && letter <= 'Z') letter = static_cast<char>(letter - 'A' + 'a');
-  }
-  return text;
-}
 
 bool isHTML(const XQueryResource& resource, const NSURL& URL) {
   if (resource.MIMEType && lowerCase(*resource.MIMEType) == "text/html") return true;

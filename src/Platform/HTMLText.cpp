@@ -1,9 +1,8 @@
 #include "Platform/HTMLText.h"
 
+#include "Platform/ASCII.h"
 #include "Platform/TextEncoding.h"
 #include "xquery/String.h"
-
-#include <algorithm>
 
 namespace xquery {
 
@@ -36,10 +35,7 @@ bool isEncodingCharacter(char byte) {
 // What follows "charset=" in the head, in lower case; empty when nothing does.
 std::string namedEncoding(std::string_view bytes) {
   constexpr size_t searched = 1024;
-  std::string head(bytes.substr(0, searched));
-  std::transform(head.begin(), head.end(), head.begin(), [](char byte) {
-    return byte >= 'A' && byte <= 'Z' ? static_cast<char>(byte - 'A' + 'a') : byte;
-  });
+  const std::string head = lowerCase(bytes.substr(0, searched));
   constexpr std::string_view key = "charset";
   for (size_t at = head.find(key); at != head.npos; at = head.find(key, at)) {
     at += key.size();

@@ -1,3 +1,4 @@
+#include "Platform/ASCII.h"
 #include "xquery/Loading.h"
 
 #include <algorithm>
@@ -5,18 +6,6 @@
 #include <system_error>
 
 namespace xquery {
-
-namespace {
-
-std::string lowerCase(std::string_view text) {
-  std::string lower(text);
-  for (char& letter : lower) {
-    if (letter >= 'A' && letter <= 'Z') letter = static_cast<char>(letter - 'A' + 'a');
-  }
-  return lower;
-}
-
-}  // namespace
 
 XQueryLoadingPolicy XQueryLoadingPolicy::allowAll() {
   return denyAll().allowScheme("file").allowScheme("http").allowScheme("https");

@@ -1,3 +1,4 @@
+#include "Platform/ASCII.h"
 #include "Platform/URIParser.h"
 #include "xquery/URL.h"
 
@@ -29,10 +30,6 @@ Parts partsOf(const NSString& reference) {
   }
   parts.path = rest;
   return parts;
-}
-
-char lowerCase(char letter) {
-  return letter >= 'A' && letter <= 'Z' ? static_cast<char>(letter - 'A' + 'a') : letter;
 }
 
 int hexadecimalDigit(char digit) {
@@ -75,9 +72,7 @@ Ref<NSURL> NSURL::URLWithString(const Ref<NSString>& text, const NSURL& base) {
 }
 
 std::string NSURL::scheme() const {
-  std::string scheme(partsOf(*_text).scheme);
-  for (char& letter : scheme) letter = lowerCase(letter);
-  return scheme;
+  return lowerCase(partsOf(*_text).scheme);
 }
 
 std::string NSURL::host() const {

@@ -10,6 +10,7 @@
 #include "Platform/PCRE.h"
 
 #include "Platform/PCREClassicSyntax.h"
+#include "Platform/ThreadClock.h"
 #include "Platform/UTF8.h"
 #include "Platform/WorkMeter.h"
 
@@ -17,7 +18,6 @@
 
 #include <algorithm>
 #include <array>
-#include <ctime>
 #include <exception>
 #include <new>
 #include <optional>
@@ -35,7 +35,7 @@ constexpr int64_t unitsPerBackReference = 8;
 
 constexpr double mostSeconds = 0.5;
 constexpr double mostSecondsPerByte = 1e-6;
-constexpr uint32_t looksPerClock = 32;  // asking for the time of a thread is a system call
+constexpr uint32_t looksPerClock = 32;
 
 constexpr uint32_t matchLimit = 20'000'000;
 // Of a pattern without callouts: the limit counts anew at every place of the subject.
@@ -178,12 +178,6 @@ class Compiler {
   int _error = 0;
   size_t _offset = 0;
 };
-
-double threadSeconds() {
-  timespec time = {};
-  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
-  return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
-}
 
 // What an operation has spent of what it may.
 class Allowance {

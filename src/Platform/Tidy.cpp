@@ -9,6 +9,7 @@
 #include "Platform/Tidy.h"
 
 #include "Platform/HTMLText.h"
+#include "Platform/ThreadClock.h"
 #include "Platform/UTF8.h"
 #include "Platform/WorkMeter.h"
 
@@ -84,11 +85,6 @@ class Allocator {
   static constexpr size_t headSize = offsetof(Block, bytes);
 
   static uintptr_t here() { return reinterpret_cast<uintptr_t>(__builtin_frame_address(0)); }
-  static double secondsOfThread() {
-    timespec time = {};
-    ::clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
-    return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
-  }
   static Allocator& of(TidyAllocator* self) { return *reinterpret_cast<Shell*>(self)->allocator; }
   static Block* blockOf(void* bytes) {
     return reinterpret_cast<Block*>(static_cast<unsigned char*>(bytes) - headSize);
@@ -103,8 +99,9 @@ class Allocator {
     if (_stackStart - here() > usableStack) leave("HTML nested too deeply");
     if (more > _mostBytes - std::min(_bytes, _mostBytes)) leave("HTML takes too much memory");
     constexpr unsigned betweenClocks = 256;
-    if (++_calls % betweenClocks == 0 && secondsOfThread() > _mostSeconds)
+    if (++_calls % betweenClocks == 0 && threadSeconds() > _mostSeconds) {
       leave("HTML takes too much time");
+    }
   }
   void link(Block* block) {
     block->previous = nullptr;
@@ -472,13 +469,13 @@ bool Conversion::waitFor(pthread_t thread) {
   try {
     for (;;) {
       timespec time = {};
-      ::clock_gettime(CLOCK_REALTIME, &time);
+      ::clock_gettime(CLOCK_MONOTONIC, &time);
       time.tv_nsec += lookNanoseconds;
       if (time.tv_nsec >= second) {
         time.tv_sec += 1;
         time.tv_nsec -= second;
       }
-      const int failure = pthread_timedjoin_np(thread, nullptr, &time);
+      const int failure = pthread_clockjoin_np(thread, nullptr, CLOCK_MONOTONIC, &time);
       if (failure != ETIMEDOUT) return failure == 0;
       lookAtWork();
     }

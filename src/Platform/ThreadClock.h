@@ -1,0 +1,15 @@
+// What the calling thread has taken of the processor, for limits that a busy machine is not to
+// change. Asking is a system call.
+#pragma once
+
+#include <ctime>
+
+namespace xquery {
+
+inline double threadSeconds() {
+  timespec time = {};
+  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
+  return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
+}
+
+}  // namespace xquery
