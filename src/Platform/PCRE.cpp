@@ -25,16 +25,17 @@
 namespace xquery {
 namespace {
 
-// A unit takes some 5 ns in machine code and 20 ns interpreted.
+// A unit takes some 5 ns in machine code and 20 ns interpreted. A pattern may try hundreds of items
+// at each place of its subject, as a list of words does, and is not to fail for a subject's length.
 constexpr int64_t mostUnits = 16'000'000;
-constexpr int64_t mostUnitsPerByte = 32;
+constexpr int64_t mostUnitsPerByte = 512;
 constexpr int64_t unitsPerLook = 2048;  // about a step of work
 constexpr size_t bytesPerUnit = 8;
 constexpr int64_t unitsPerSearch = 16;
 constexpr int64_t unitsPerBackReference = 8;
 
 constexpr double mostSeconds = 0.5;
-constexpr double mostSecondsPerByte = 1e-6;
+constexpr double mostSecondsPerByte = 16e-6;
 constexpr uint32_t looksPerClock = 32;
 
 constexpr uint32_t matchLimit = 20'000'000;
