@@ -50,12 +50,12 @@ std::string namedEncoding(std::string_view bytes) {
   return {};
 }
 
-// A text whose head could be read is in no encoding of two bytes, and what calls itself Latin-1 has
-// always been read as Windows-1252.
+// What calls itself Latin-1 has always been read as Windows-1252. And a name that was read as it
+// stands cannot be in an encoding of two bytes, or in any other without the characters of ASCII.
 std::string encodingMeantBy(const std::string& name) {
-  if (name.starts_with("utf-16") || name.starts_with("utf-32")) return "utf-8";
   if (name == "iso-8859-1" || name == "latin1" || name == "us-ascii") return "windows-1252";
-  return name;
+  const auto read = stringWithBytes(name, name);
+  return read && read->view() == name ? name : "utf-8";
 }
 
 std::string asUTF8(std::string_view bytes, const std::string& encoding) {

@@ -34,6 +34,14 @@ TEST(HTMLText, AsUTF8) {
   for (const auto& row : rows) EXPECT_EQ(HTMLAsUTF8(row.bytes), row.expected) << row.bytes;
 }
 
+TEST(HTMLText, AnEncodingInWhichItsNameCouldNotBeReadIsNotMeant) {
+  for (const char* name : {"utf-16", "utf16", "UTF-16LE", "ucs-2", "unicode", "utf-32", "ucs-4",
+                           "ibm037", "ebcdic-cp-us", "bocu-1"}) {
+    const std::string text = "<meta charset=" + std::string(name) + ">\xC3\xA4";
+    EXPECT_EQ(HTMLAsUTF8(text), text);
+  }
+}
+
 TEST(HTMLText, OnlyTheFirstKilobyteNamesTheEncoding) {
   const std::string name = "<meta charset=koi8-r>";
   const std::string inside = std::string(1024 - name.size(), ' ') + name;
