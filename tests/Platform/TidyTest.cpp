@@ -2,6 +2,7 @@
 #include "Platform/LoadingTestSupport.h"
 #include "Platform/ProcessorTime.h"
 #include "Platform/Tidy.h"
+#include "Platform/WorkMeter.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
@@ -264,6 +265,22 @@ TEST(TidyHostile, WhateverIsReadIsWellFormed) {
                                                                     << HTML << "\n"
                                                                     << *XHTML;
   }
+}
+
+struct Interruption {};
+
+class Interrupter final : public WorkWatcher {
+ public:
+  Interrupter() { workMeter.watcher = this; }
+  ~Interrupter() { workMeter = WorkMeter{}; }
+  void lookAtWork() override { throw Interruption(); }
+};
+
+TEST(TidyHostile, AReadingThatIsNotWaitedForEnds) {
+  const std::string HTML = repeated("<p>hello <b>world</b></p>\n", 100'000);
+  const Interrupter interrupter;
+  std::string failure;
+  EXPECT_THROW((void)XHTMLFromHTML(HTML, failure), Interruption);
 }
 
 TEST(Tidy, RunsInSeveralThreadsAtOnce) {
