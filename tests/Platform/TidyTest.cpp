@@ -277,7 +277,8 @@ class Interrupter final : public WorkWatcher {
 };
 
 TEST(TidyHostile, AReadingThatIsNotWaitedForEnds) {
-  const std::string HTML = repeated("<p>hello <b>world</b></p>\n", 100'000);
+  // Seconds of reading, so that a busy machine looks before it is read.
+  const std::string HTML = repeated("<p>hello <b>world</b></p>\n", 1'000'000);
   const Interrupter interrupter;
   std::string failure;
   EXPECT_THROW((void)XHTMLFromHTML(HTML, failure), Interruption);
