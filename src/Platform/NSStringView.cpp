@@ -2,8 +2,8 @@
 //
 // Both representations give the same answers. 8-bit text against 8-bit text, the common case, goes
 // through the C library's byte functions; the other pairings share one implementation per question.
+#include "Platform/TextBlocks.h"
 #include "Platform/UTF16.h"
-#include "Platform/WorkMeter.h"
 #include "xquery/String.h"
 
 #include <algorithm>
@@ -13,12 +13,6 @@
 namespace xquery {
 
 namespace {
-
-// After so many units were looked at: only long texts are work of their own.
-void checkUnits(uint32_t count) {
-  constexpr uint32_t unitsPerStep = 8192;
-  if (count >= unitsPerStep) checkWork(count / unitsPerStep);
-}
 
 template <class Unit>
 char16_t widened(Unit unit) {

@@ -4,14 +4,21 @@
 #include "Platform/WorkMeter.h"
 #include "xquery/String.h"
 
+#include <cstdint>
 #include <string_view>
 
 namespace xquery {
 
+constexpr uint32_t unitsPerBlock = 8192;
+
+// After so many units were looked at in one go: only long texts are work of their own.
+inline void checkUnits(uint32_t count) {
+  if (count >= unitsPerBlock) checkWork(count / unitsPerBlock);
+}
+
 // Calls `work` with each piece in turn; of a text of one piece with the text itself.
 template <class Text, class Work>
 void inBlocks(std::basic_string_view<Text> text, Work work) {
-  constexpr size_t unitsPerBlock = 8192;
   for (; text.size() > unitsPerBlock; text.remove_prefix(unitsPerBlock)) {
     work(text.substr(0, unitsPerBlock));
     checkWork();

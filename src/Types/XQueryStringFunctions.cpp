@@ -10,12 +10,6 @@ namespace xquery {
 
 namespace {
 
-// After so many units were looked at: only long stretches are work of their own.
-void checkUnits(uint32_t count) {
-  constexpr uint32_t unitsPerStep = 4096;
-  if (count >= unitsPerStep) checkWork(count / unitsPerStep);
-}
-
 uint32_t leadingWhiteSpace(NSStringView text) {
   uint32_t count = 0;
   while (count < text.length() && XQueryIsWhiteSpace(text[count])) ++count;
