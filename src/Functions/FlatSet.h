@@ -11,8 +11,12 @@
 // Keys whose hashes were made to meet would turn every look into a walk past all of them. A key
 // that finds no free slot within `longestWalk` goes into an ordered set instead, so that the worst
 // keys cost a logarithm.
+//
+// A table of millions takes long to double and to visit, so that the evaluation may end in between.
+// A set that it ended in is good for nothing but being destroyed.
 #pragma once
 
+#include "Platform/WorkMeter.h"
 #include "xquery/Object.h"
 
 #include <algorithm>
@@ -52,8 +56,13 @@ class FlatSet {
   // In the order of insertion, but for those in the ordered set.
   template <class Work>
   void forEach(Work work) const {
-    for (const Key& key : _keys) work(key);
-    for (const Key& key : _crowded) work(key);
+    WorkPacer pacer;
+    const auto paced = [&](const Key& key) {
+      pacer.turn();
+      work(key);
+    };
+    for (const Key& key : _keys) paced(key);
+    for (const Key& key : _crowded) paced(key);
   }
 
  private:
@@ -99,7 +108,9 @@ class FlatSet {
   void grow() {
     Vector<Slot> slots(std::max(smallestTable, _slots.size() * 2));
     _slots.swap(slots);
+    WorkPacer pacer;
     for (const Slot& slot : slots) {
+      pacer.turn();
       if (slot.number != 0) place(slot);
     }
   }
