@@ -152,7 +152,7 @@ void XQueryElementContent::prepareForAttribute(const NSXMLName& name) {
 }
 
 void XQueryElementContent::append(NSXMLNode* attribute) {
-  NSXMLTree::appendAttribute(&element(), attribute, _lastAttribute);
+  NSXMLTree::appendProperty(&element(), attribute, _lastAttribute);
   _lastAttribute = attribute;
   ++_attributeCount;
 }

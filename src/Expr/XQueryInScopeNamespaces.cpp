@@ -1,10 +1,13 @@
 #include "Expr/XQueryInScopeNamespaces.h"
 
 #include "Eval/XQueryContextInternal.h"
+#include "Platform/WorkMeter.h"
 #include "Platform/XMLNames.h"
+#include "Platform/XMLTree.h"
 #include "Types/XQueryNodeFunctions.h"
 
 #include <algorithm>
+#include <unordered_set>
 
 namespace xquery {
 namespace {
@@ -51,11 +54,25 @@ bool XQueryInScopeNamespaces::updateNamespacesForElement(NSXMLElement& element,
   return true;
 }
 
+// There may be very many: each is linked behind the last one, and a table finds the prefixes that
+// the copy declares itself.
 void XQueryInScopeNamespaces::keepNamespaces(NSXMLElement& copy, const NSXMLElement& formerParent) {
+  std::unordered_set<const NSXMLName*> own;
+  NSXMLNode* last = nullptr;
+  WorkPacer pacer;
+  for (NSXMLNode* node = copy.firstNamespace(); node; node = NSXMLElement::nextNamespace(node)) {
+    pacer.turn();
+    own.insert(node->nodeName());
+    last = node;
+  }
   for (const Ref<NSXMLNode>& declaration : CopyXQueryNodeNamespaces(&formerParent)) {
-    if (!isBoundTo(declaration->nameView(), declaration->textView(), _context)) {
-      copy.addNamespace(declaration);
+    pacer.turn();
+    if (own.contains(declaration->nodeName()) ||
+        isBoundTo(declaration->nameView(), declaration->textView(), _context)) {
+      continue;
     }
+    NSXMLTree::appendProperty(&copy, declaration.get(), last);
+    last = declaration.get();
   }
 }
 

@@ -498,16 +498,17 @@ void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property) {
   *link = property;
 }
 
-void NSXMLTree::appendAttribute(NSXMLElement* element, NSXMLNode* attribute, NSXMLNode* last) {
+void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property, NSXMLNode* last) {
   if (!last) {
-    appendProperty(element, attribute);
+    appendProperty(element, property);
     return;
   }
-  prepareToJoin(of(element), of(attribute));
-  merge(of(element), of(attribute));
+  prepareToJoin(of(element), of(property));
+  merge(of(element), of(property));
   noteChange(element);
-  attribute->_parent = element;
-  last->_next = attribute;
+  property->_parent = element;
+  property->_next = last->_next;
+  last->_next = property;
 }
 
 void NSXMLTree::unlink(NSXMLNode* node) {

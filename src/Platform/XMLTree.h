@@ -140,8 +140,9 @@ class NSXMLTree : public NSXMLTreeHead {
   // Links a parentless node, moving its tree into this one. `before` is null to append.
   static void insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before);
   static void appendProperty(NSXMLElement* element, NSXMLNode* property);
-  // For an element's many attributes in turn: `last` is its last one, null for none.
-  static void appendAttribute(NSXMLElement* element, NSXMLNode* attribute, NSXMLNode* last);
+  // For an element's many attributes or namespaces in turn: `last` is its last one of that kind,
+  // null for none.
+  static void appendProperty(NSXMLElement* element, NSXMLNode* property, NSXMLNode* last);
   static void detach(NSXMLNode* node);
   // How many nodes the calling thread has linked so far: as long as it links none, what is around
   // the nodes of its evaluation stays as it is.

@@ -28,6 +28,7 @@ bool visitNamespaces(const NSXMLNode* node, Visit visit) {
     if (!element) continue;
     for (NSXMLNode* declaration = element->firstNamespace(); declaration;
          declaration = NSXMLElement::nextNamespace(declaration)) {
+      pacer.turn();
       if (seen.insert(declaration->nameView()).second) visit(declaration);
     }
   }
@@ -239,6 +240,7 @@ Ref<NSString> XQueryNodeNamespaceForPrefix(const NSXMLNode* node, NSStringView p
     if (!element) continue;
     for (const NSXMLNode* declaration = element->firstNamespace(); declaration;
          declaration = NSXMLElement::nextNamespace(declaration)) {
+      pacer.turn();
       if (declaration->nameView() == prefix) found = declaration;
     }
   }

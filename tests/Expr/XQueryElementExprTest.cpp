@@ -3,6 +3,7 @@
 #include "Expr/XQueryElementContentString.h"
 #include "Expr/XQueryElementExpr.h"
 #include "Expr/XQueryNodeExprs.h"
+#include "Platform/ProcessorTime.h"
 
 #include <memory>
 #include <thread>
@@ -176,6 +177,34 @@ TEST_F(ElementExpr, NamespacesOfAFormerParentAreKeptWhereTheyAreNotInherited) {
   EXPECT_EQ(namespacesOf(*cast<NSXMLElement>(made(*expr)->firstChild())),
             "q=urn:q =urn:d o=urn:o ");
   EXPECT_EQ(namespacesOf(*cast<NSXMLElement>(child)), "q=urn:q ") << "the original is as it was";
+}
+
+TEST_F(ElementExpr, KeepingManyNamespacesTakesTimeInProportion) {
+  const auto query = XQuery::xqueryWithSource("declare inherit-namespaces no; <x>{//a}</x>");
+  const auto secondsToKeep = [&](size_t count) {
+    constexpr size_t mostInATag = 3000;
+    std::string start;
+    std::string end;
+    for (size_t index = 0; index < count; ++index) {
+      if (index % mostInATag == 0) {
+        start += start.empty() ? "<e" : "><e";
+        end += "</e>";
+      }
+      start += " xmlns:p" + std::to_string(index) + "='urn:p'";
+    }
+    const auto parsed = NSXMLDocument::documentWithData(start + "><a/>" + end, 0);
+    Ref<NSArray> result;
+    const double seconds =
+        processorSecondsOf([&] { result = context->evaluateXQuery(*query, {}, parsed, nullptr); });
+    const auto* a = cast<NSXMLElement>(cast<NSXMLNode>(result->objectAtIndex(0))->firstChild());
+    size_t kept = 0;
+    for (const auto* node = a->firstNamespace(); node; node = NSXMLElement::nextNamespace(node)) {
+      ++kept;
+    }
+    EXPECT_EQ(kept, count);
+    return seconds;
+  };
+  EXPECT_TRUE(growsInProportion(secondsToKeep, 24000));
 }
 
 // --- content -------------------------------------------------------------------------------------

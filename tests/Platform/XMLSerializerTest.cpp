@@ -192,7 +192,7 @@ std::string attributesOfNamespaces(size_t count, double& seconds) {
   for (size_t index = 0; index < count; ++index) {
     const std::string number = std::to_string(index);
     const auto attribute = NSXMLNode::attributeWithName(A("p" + number + ":x"), A(""), A(number));
-    NSXMLTree::appendAttribute(a.get(), attribute.get(), last);
+    NSXMLTree::appendProperty(a.get(), attribute.get(), last);
     last = attribute.get();
   }
   std::string text;

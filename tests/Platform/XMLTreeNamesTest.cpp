@@ -113,7 +113,7 @@ TEST(XMLRoom, AttributesFollowEachOther) {
   for (const char* name : {"b", "c", "d"}) {
     NSXMLNode* attribute = NSXMLTree::makeLoneAttribute(
         NSXMLInternName(NSStringView::ascii(name), {}), NSStringView::ascii("1"));
-    NSXMLTree::appendAttribute(a.get(), attribute, last);
+    NSXMLTree::appendProperty(a.get(), attribute, last);
     last = attribute;
     a->addNamespace(
         NSXMLNode::namespaceWithName(NSStringView::ascii(name), NSStringView::ascii("u")));

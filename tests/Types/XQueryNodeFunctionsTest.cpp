@@ -1,4 +1,5 @@
 #include "Platform/ProcessorTime.h"
+#include "Platform/WorkMeter.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "TypesTestSupport.h"
 
@@ -157,6 +158,21 @@ TEST(NodeInScopePrefixes, WithoutAnyDeclarationThereAreNoneAtAll) {
   const auto document = parse("<a><b/></a>");
   EXPECT_EQ(joined(XQueryNodeInScopePrefixes(named(document, "b"))), "");
   EXPECT_EQ(joined(XQueryNodeInScopePrefixes(nullptr)), "");
+}
+
+TEST(NodeInScopePrefixes, EachDeclarationOfAnElementCountsAsWork) {
+  constexpr int many = 5000;
+  std::string xml = "<a";
+  for (int number = 0; number < many; ++number) xml += " xmlns:p" + std::to_string(number) + "='u'";
+  const auto document = parse(xml + "/>");
+  int64_t stepsLeft = workMeter.stepsLeft;
+  const auto prefixes = XQueryNodeInScopePrefixes(root(document));
+  EXPECT_GE(stepsLeft - workMeter.stepsLeft, many / WorkPacer::turnsPerStep);
+  EXPECT_EQ(prefixes.size(), many + 1U);
+  stepsLeft = workMeter.stepsLeft;
+  const auto URI = XQueryNodeNamespaceForPrefix(root(document), view("p7"));
+  EXPECT_GE(stepsLeft - workMeter.stepsLeft, many / WorkPacer::turnsPerStep);
+  EXPECT_EQ(utf8(URI), "u");
 }
 
 TEST(NodeInScopePrefixes, ADeclaredXMLPrefixIsNotAddedAgain) {
