@@ -1,10 +1,10 @@
 // Reads the lexical forms of durations: letters as written, numbers of digits only.
 #pragma once
 
+#include "Platform/WorkMeter.h"
 #include "xquery/Number.h"
 #include "xquery/String.h"
 
-#include <algorithm>
 #include <cstdint>
 #include <string>
 
@@ -20,36 +20,43 @@ class DurationReader {
     ++_position;
     return true;
   }
-  // Fails on more than 64 bits hold.
+  // Fails on more than 64 bits hold, with all the digits behind it.
   bool integer(int64_t& out) {
-    std::string text;
-    if (!digits(text)) return false;
+    const NSStringView number = digits();
+    bool fits = !number.isEmpty();
     out = 0;
-    for (const char digit : text) {
-      if (__builtin_mul_overflow(out, int64_t{10}, &out) ||
-          __builtin_add_overflow(out, int64_t{digit - '0'}, &out)) {
-        return false;
-      }
+    WorkPacer pacer;
+    for (uint32_t index = 0; fits && index < number.length(); ++index) {
+      pacer.turn();
+      fits = !__builtin_mul_overflow(out, int64_t{10}, &out) &&
+             !__builtin_add_overflow(out, int64_t{number[index] - '0'}, &out);
     }
-    return true;
+    return fits;
   }
   // The digits after a "." that followed `whole`. They are read as an integer, so that their
   // leading zeros are lost: 1.05 reads as 1.5.
   bool fraction(int64_t whole, double& out) {
-    std::string text;
-    if (!digits(text)) return false;
-    text.erase(0, std::min(text.find_first_not_of('0'), text.size() - 1));
-    return scanDouble(NSStringView::ascii(std::to_string(whole) + "." + text), out);
+    const NSStringView number = digits();
+    if (number.isEmpty()) return false;
+    uint32_t zeros = 0;
+    WorkPacer pacer;
+    while (zeros + 1 < number.length() && number[zeros] == '0') {
+      pacer.turn();
+      ++zeros;
+    }
+    const std::string text = std::to_string(whole) + "." + number.substring(zeros).utf8();
+    return scanDouble(NSStringView::ascii(text), out);
   }
 
  private:
-  // At least one digit, kept as written.
-  bool digits(std::string& out) {
-    out.clear();
+  // As many as there are, which may be none or millions.
+  NSStringView digits() {
+    const uint32_t from = _position;
+    WorkPacer pacer;
     for (; !atEnd() && _text[_position] >= '0' && _text[_position] <= '9'; ++_position) {
-      out += static_cast<char>(_text[_position]);
+      pacer.turn();
     }
-    return !out.empty();
+    return _text.substring(from, _position - from);
   }
 
   NSStringView _text;

@@ -1,3 +1,4 @@
+#include "Platform/WorkMeter.h"
 #include "Platform/ZoneTestSupport.h"
 #include "Types/XQueryNumber.h"
 
@@ -404,6 +405,7 @@ TEST(XQueryNumber, DayTimeDurationsParse) {
       {"PT1.50S", 1.5},
       {"PT1.0S", 1},
       {"PT1.000S", 1},
+      {"PT1.0001S", 1.1},
       {"PT1H1.5S", 3601.5},
       {"PT1M1.5S", 61.5},
       {"PT90M", 5400},
@@ -430,6 +432,20 @@ TEST(XQueryNumber, DayTimeDurationsRejectEveryDeviation) {
                           "P1Y",    "P1M",    "P1Y1D",    "--P1D",   "PT99999999999999999999S",
                           "PT1SX"}) {
     EXPECT_FALSE(XQueryNumber::dayTimeDurationWithString(NSStringView::ascii(bad))) << bad;
+  }
+}
+
+TEST(XQueryNumber, ReadingMillionsOfDigitsCountsAsWork) {
+  constexpr int many = 1000000;
+  const std::string sevens(many, '7');
+  const std::string zeros(many, '0');
+  for (const std::string& text :
+       {"P" + sevens + "Y", "P" + sevens + "M", "P" + zeros + "1Y", "P" + sevens + "D",
+        "PT" + zeros + "1S", "PT1." + sevens + "S", "PT1." + zeros + "1S"}) {
+    const int64_t before = workMeter.stepsLeft;
+    static_cast<void>(XQueryNumber::yearMonthDurationWithString(NSStringView::ascii(text)));
+    static_cast<void>(XQueryNumber::dayTimeDurationWithString(NSStringView::ascii(text)));
+    EXPECT_GE(before - workMeter.stepsLeft, many / WorkPacer::turnsPerStep) << text.substr(0, 9);
   }
 }
 
