@@ -167,19 +167,9 @@ Ref<NSString> XQueryNodeTypedValue(const NSXMLNode* node) {
   return XQueryNodeStringValue(node);
 }
 
+// A node without children has no text below it, though it may have one of its own.
 void XQueryNodeAddChildTextValues(const NSXMLNode* node, NSMutableString& text) {
-  const NSXMLNode* current = node ? node->firstChild() : nullptr;
-  WorkPacer pacer;
-  while (current) {
-    pacer.turn();
-    if (current->kind() == Kind::Text) text.append(current->textView());
-    const NSXMLNode* next = current->kind() == Kind::Element ? current->firstChild() : nullptr;
-    while (!next && current != node) {
-      next = current->nextSibling();
-      if (!next) current = current->parent();
-    }
-    current = next;
-  }
+  if (node && node->firstChild()) node->appendStringValueTo(text);
 }
 
 Ref<NSString> XQueryNodeName(const NSXMLNode* node) {

@@ -56,6 +56,8 @@ TEST(NodeAddChildTextValues, AppendsTheTextBelowInOrder) {
   EXPECT_EQ(utf8(string.string()), "=xyzw");
   XQueryNodeAddChildTextValues(named(document, "c"), string);
   EXPECT_EQ(utf8(string.string()), "=xyzwz");
+  XQueryNodeAddChildTextValues(named(document, "c")->firstChild(), string);
+  EXPECT_EQ(utf8(string.string()), "=xyzwz") << "its own text is not below it";
 }
 
 TEST(NodeFunctions, AMissingNodeHasNothing) {
