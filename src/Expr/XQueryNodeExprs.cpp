@@ -25,14 +25,14 @@ bool appendTextOf(const Ref<XQueryExpr>& part, NSMutableString& text, XQueryCont
 
 }  // namespace
 
+void XQueryValueConstructor::bindInfoForProlog(XQueryProlog& prolog) {
+  bindPart(_value, prolog);
+}
+
 // --- text ----------------------------------------------------------------------------------------
 
 Ref<XQueryTextExpr> XQueryTextExpr::textExprWithValue(Ref<XQueryExpr> value) {
   return make<XQueryTextExpr>(std::move(value));
-}
-
-void XQueryTextExpr::bindInfoForProlog(XQueryProlog& prolog) {
-  bindPart(_value, prolog);
 }
 
 Value XQueryTextExpr::evaluateWithContext(XQueryContext& context) const {
@@ -45,10 +45,6 @@ Value XQueryTextExpr::evaluateWithContext(XQueryContext& context) const {
 
 Ref<XQueryCommentExpr> XQueryCommentExpr::commentExprWithValue(Ref<XQueryExpr> value) {
   return make<XQueryCommentExpr>(std::move(value));
-}
-
-void XQueryCommentExpr::bindInfoForProlog(XQueryProlog& prolog) {
-  bindPart(_value, prolog);
 }
 
 Value XQueryCommentExpr::evaluateWithContext(XQueryContext& context) const {
@@ -98,17 +94,13 @@ Ref<XQueryDocumentExpr> XQueryDocumentExpr::documentWithExpr(Ref<XQueryExpr> exp
   return make<XQueryDocumentExpr>(std::move(expr));
 }
 
-void XQueryDocumentExpr::bindInfoForProlog(XQueryProlog& prolog) {
-  bindPart(_expr, prolog);
-}
-
 Value XQueryDocumentExpr::evaluateWithContext(XQueryContext& context) const {
   XQueryCheckStack(context);
   auto& dynamic = context._internal();
   const Ref<NSXMLDocument> document = NSXMLDocument::document();
   dynamic.setBaseURI(dynamic.baseURI(), document.get());
   XQueryDocumentContent content(*document, context, exprLine());
-  content.add(_expr->evaluateWithContext(context));
+  content.add(_value->evaluateWithContext(context));
   content.finish();
   return document;
 }

@@ -7,40 +7,42 @@
 
 namespace xquery {
 
-// text {...}: the empty sequence makes no node.
-class XQueryTextExpr : public XQueryExpr {
+// A constructor that has a value and no name.
+class XQueryValueConstructor : public XQueryExpr {
  public:
-  [[nodiscard]] static Ref<XQueryTextExpr> textExprWithValue(Ref<XQueryExpr> value);
-
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
 
  protected:
-  explicit XQueryTextExpr(Ref<XQueryExpr> value)
+  explicit XQueryValueConstructor(Ref<XQueryExpr> value)
       : XQueryExpr(Kind::OtherExpr), _value(std::move(value)) {}
-  template <class T, class... Arguments>
-  friend Ref<T> make(Arguments&&...);
 
- private:
   Ref<XQueryExpr> _value;
 };
 
-// comment {...}
-class XQueryCommentExpr : public XQueryExpr {
+// text {...}: the empty sequence makes no node.
+class XQueryTextExpr : public XQueryValueConstructor {
  public:
-  [[nodiscard]] static Ref<XQueryCommentExpr> commentExprWithValue(Ref<XQueryExpr> value);
+  [[nodiscard]] static Ref<XQueryTextExpr> textExprWithValue(Ref<XQueryExpr> value);
 
-  void bindInfoForProlog(XQueryProlog& prolog) override;
   Value evaluateWithContext(XQueryContext& context) const override;
 
  protected:
-  explicit XQueryCommentExpr(Ref<XQueryExpr> value)
-      : XQueryExpr(Kind::OtherExpr), _value(std::move(value)) {}
+  using XQueryValueConstructor::XQueryValueConstructor;
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
+};
 
- private:
-  Ref<XQueryExpr> _value;
+// comment {...}
+class XQueryCommentExpr : public XQueryValueConstructor {
+ public:
+  [[nodiscard]] static Ref<XQueryCommentExpr> commentExprWithValue(Ref<XQueryExpr> value);
+
+  Value evaluateWithContext(XQueryContext& context) const override;
+
+ protected:
+  using XQueryValueConstructor::XQueryValueConstructor;
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
 };
 
 // processing-instruction {...} {...}, and the direct form.
@@ -65,21 +67,16 @@ class XQueryProcessingInstructionExpr : public XQueryExpr {
 };
 
 // document {...}
-class XQueryDocumentExpr : public XQueryExpr {
+class XQueryDocumentExpr : public XQueryValueConstructor {
  public:
   [[nodiscard]] static Ref<XQueryDocumentExpr> documentWithExpr(Ref<XQueryExpr> expr);
 
-  void bindInfoForProlog(XQueryProlog& prolog) override;
   Value evaluateWithContext(XQueryContext& context) const override;
 
  protected:
-  explicit XQueryDocumentExpr(Ref<XQueryExpr> expr)
-      : XQueryExpr(Kind::OtherExpr), _expr(std::move(expr)) {}
+  using XQueryValueConstructor::XQueryValueConstructor;
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
-
- private:
-  Ref<XQueryExpr> _expr;
 };
 
 // A namespace declaration attribute of a direct constructor.
