@@ -35,11 +35,11 @@ class XQueryElementExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  size_t roomBytes() const;
+
   XQueryConstructorName _name;
   Exprs _attributes;  // attribute and namespace expressions
   Exprs _items;
-  size_t roomBytes() const;
-
   size_t _roomBytes = 0;                    // for the attributes and the text of an element
   std::vector<Ref<NSXMLNode>> _namespaces;  // declared with literal URIs; copied into each element
 };

@@ -66,8 +66,8 @@ class XQueryTypeDeclaration : public XQueryExpr {
   Value _data;
 };
 
-// "instance of" over a value: answers whether the value matches. `context` may be null (kind tests
-// in path steps pass none).
+// "instance of" over a value: answers whether the value matches. `forContext` may be null (kind
+// tests in path steps pass none).
 bool XQueryInstanceOf(const NSObject* object, const XQueryTypeDeclaration& instanceOf,
                       XQueryContext* forContext);
 // The value itself when it matches; otherwise raises error 6 "invalid type".

@@ -29,7 +29,8 @@ std::string XQueryItemTypeName(const NSObject& item) {
   }
   const Ref<XQueryQName> name = XQueryQNameForTypeID(XQueryObjectTypeID(&item));
   if (!name) return "item()";
-  const bool inSchema = name->namespaceURI()->view() == "http://www.w3.org/2001/XMLSchema";
+  const Ref<XQueryQName> schemaName = XQueryQNameForTypeID(XQueryTypeAnyType);
+  const bool inSchema = name->namespaceURI() == schemaName->namespaceURI();
   return (inSchema ? "xs:" : "xdt:") + name->localPart()->utf8();
 }
 

@@ -163,7 +163,7 @@ const TypeTables& typeTables() {
   return *tables;
 }
 
-// Both are integer types, a < b.
+// Both are integer types, low < high.
 XQueryTypeID leastCommonIntegerType(XQueryTypeID low, XQueryTypeID high) {
   switch (low) {
     case XQueryTypeInteger:
@@ -192,7 +192,7 @@ Ref<XQueryQName> XQueryQNameForTypeID(XQueryTypeID id) {
 
 XQueryTypeID XQueryTypeIDForQName(const XQueryQName& qName) {
   const auto& mappings = typeTables().sXQueryNameIDMappings;
-  const auto found = mappings.find(Ref<XQueryQName>(const_cast<XQueryQName*>(&qName)));
+  const auto found = mappings.find(qName);
   return found == mappings.end() ? XQueryTypeNone : found->second;
 }
 
