@@ -64,12 +64,15 @@ template <class Unit, class PatternUnit>
 uint32_t findLinear(const Unit* text, uint32_t length, const PatternUnit* pattern,
                     uint32_t patternLength, uint32_t from) {
   std::vector<uint32_t> fallback(patternLength, 0);
+  WorkPacer pacer;
   for (uint32_t index = 1, matched = 0; index < patternLength; ++index) {
+    pacer.turn();
     while (matched && pattern[index] != pattern[matched]) matched = fallback[matched - 1];
     if (pattern[index] == pattern[matched]) ++matched;
     fallback[index] = matched;
   }
   for (uint32_t index = from, matched = 0; index < length; ++index) {
+    pacer.turn();
     while (matched && widened(text[index]) != widened(pattern[matched])) {
       matched = fallback[matched - 1];
     }
@@ -92,19 +95,16 @@ uint32_t findUnit(const Unit* text, uint32_t length, char16_t unit, uint32_t fro
   }
 }
 
+// Of a pattern that is short: but for the library's search, it is tried at each place where its
+// first unit stands.
 template <class Unit, class PatternUnit>
-uint32_t findUnits(const Unit* text, uint32_t length, const PatternUnit* pattern,
+uint32_t findShort(const Unit* text, uint32_t length, const PatternUnit* pattern,
                    uint32_t patternLength, uint32_t from) {
   if constexpr (sizeof(Unit) == 1 && sizeof(PatternUnit) == 1) {
     const void* found = memmem(text + from, length - from, pattern, patternLength);
     return found ? static_cast<uint32_t>(static_cast<const Unit*>(found) - text)
                  : NSStringView::notFound;
   } else {
-    // Short patterns are tried at each place where their first unit stands.
-    constexpr uint32_t shortLength = 16;
-    if (patternLength > shortLength) {
-      return findLinear(text, length, pattern, patternLength, from);
-    }
     const uint32_t last = length - patternLength;
     while (from <= last) {
       const uint32_t start = findUnit(text, last + 1, widened(pattern[0]), from);
@@ -113,6 +113,24 @@ uint32_t findUnits(const Unit* text, uint32_t length, const PatternUnit* pattern
       from = start + 1;
     }
     return NSStringView::notFound;
+  }
+}
+
+// A long text is searched in pieces, between which the search can be ended. They overlap by the
+// pattern but for one unit, so that each place is looked at in one of them.
+template <class Unit, class PatternUnit>
+uint32_t findUnits(const Unit* text, uint32_t length, const PatternUnit* pattern,
+                   uint32_t patternLength, uint32_t from) {
+  constexpr uint32_t placesOfPiece = 0x10000;
+  constexpr bool areBytes = sizeof(Unit) == 1 && sizeof(PatternUnit) == 1;
+  constexpr uint32_t longest = areBytes ? placesOfPiece : 16;
+  if (patternLength > longest) return findLinear(text, length, pattern, patternLength, from);
+  for (;; from += placesOfPiece) {
+    const bool isLast = length - from - patternLength < placesOfPiece;
+    const uint32_t end = isLast ? length : from + placesOfPiece + patternLength - 1;
+    const uint32_t found = findShort(text, end, pattern, patternLength, from);
+    checkUnits((found == NSStringView::notFound ? end : found) - from);
+    if (found != NSStringView::notFound || isLast) return found;
   }
 }
 
@@ -175,13 +193,11 @@ NSStringView NSStringView::substring(uint32_t from, uint32_t count) const {
 uint32_t NSStringView::find(NSStringView text, uint32_t from) const {
   if (from > _length || text._length > _length - from) return notFound;
   if (text.isEmpty()) return from;
-  const uint32_t found = withUnits(*this, [&](auto* units) {
+  return withUnits(*this, [&](auto* units) {
     return withUnits(text, [&](auto* pattern) {
       return findUnits(units, _length, pattern, text._length, from);
     });
   });
-  checkUnits((found == notFound ? _length : found) - from);
-  return found;
 }
 
 uint32_t NSStringView::find(char16_t unit, uint32_t from) const {

@@ -1,6 +1,7 @@
 // Both representations of a text must give the same answers, so most tests ask every question of
 // all four pairings over generated texts and compare with a plain implementation.
 #include "Platform/ProcessorTime.h"
+#include "Platform/WorkMeter.h"
 #include "xquery/String.h"
 
 #include <gtest/gtest.h>
@@ -106,6 +107,63 @@ TEST(StringView, HostileSearchTakesLinearTime) {
   const double start = processorSeconds();
   EXPECT_EQ(Both::wideView(text).find(Both::wideView(pattern)), NSStringView::notFound);
   EXPECT_LT(processorSeconds() - start, 2);
+}
+
+// Long texts are searched in pieces, which must not show where they meet.
+TEST(StringView, FindInLongTextsMissesNoPlace) {
+  constexpr uint32_t pieceLength = 0x10000;
+  for (const uint32_t patternLength : {1U, 2U, 16U, 17U, 5000U, pieceLength, pieceLength + 1}) {
+    const Both pattern(std::string(patternLength, 'b'));
+    for (const uint32_t start : {pieceLength - patternLength, pieceLength - 1, pieceLength,
+                                 pieceLength + 1, 2 * pieceLength - 1, 2 * pieceLength}) {
+      std::string letters(3 * pieceLength, 'a');
+      if (start > letters.size() - patternLength) continue;
+      letters.replace(start, patternLength, pattern.ascii);
+      const Both text(std::move(letters));
+      for (const NSStringView textView : text.views()) {
+        for (const NSStringView patternView : pattern.views()) {
+          EXPECT_EQ(textView.find(patternView), start) << patternLength;
+          EXPECT_EQ(textView.find(patternView, start), start) << patternLength;
+          EXPECT_EQ(textView.find(patternView, start + 1), NSStringView::notFound) << patternLength;
+        }
+      }
+    }
+  }
+}
+
+struct Ended {};
+
+// Ends the work of this thread when it is looked at for the second time.
+class SecondLook final : public WorkWatcher {
+ public:
+  SecondLook() {
+    workMeter.stepsLeft = 1;
+    workMeter.watcher = this;
+  }
+  ~SecondLook() {
+    workMeter.watcher = nullptr;
+    workMeter.stepsLeft = WorkMeter::manySteps;
+  }
+  void lookAtWork() override {
+    workMeter.stepsLeft = 1;
+    if (++_looks == 2) throw Ended();
+  }
+
+ private:
+  int _looks = 0;
+};
+
+TEST(StringView, ASearchThroughALongTextCanBeEnded) {
+  const Both text(std::string(1000000, 'a'));
+  for (const uint32_t patternLength : {1U, 3U, 30U, 300000U}) {
+    const Both pattern(std::string(patternLength - 1, 'a') + "b");
+    for (const NSStringView textView : text.views()) {
+      for (const NSStringView patternView : pattern.views()) {
+        const SecondLook watcher;
+        EXPECT_THROW(textView.find(patternView), Ended) << patternLength;
+      }
+    }
+  }
 }
 
 TEST(StringView, StartsAndEndsAgreeWithSubstrings) {
