@@ -93,8 +93,6 @@ uint32_t removeSmallFactor(int64_t& value, int64_t factor) {
   return count;
 }
 
-}  // namespace
-
 // The coefficient of a large decimal: counted as memory of values, and its making as work. The
 // slowest operations take about a millisecond per 10,000 digits.
 BigInteger* kept(BigInteger coefficient) {
@@ -105,6 +103,8 @@ BigInteger* kept(BigInteger coefficient) {
   chargeWork(bytes / bytesPerStep);
   return owned.release();
 }
+
+}  // namespace
 
 // The operations that look inside.
 class NSDecimalArithmetic {
