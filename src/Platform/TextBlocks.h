@@ -5,6 +5,8 @@
 #include "xquery/String.h"
 
 #include <cstdint>
+#include <new>
+#include <string>
 #include <string_view>
 
 namespace xquery {
@@ -33,11 +35,15 @@ auto withUnitsOf(NSStringView text, Work work) {
                        : work(std::string_view(text.asciiUnits(), text.length()));
 }
 
-inline NSStringView viewOf(std::string_view ascii) {
-  return NSStringView::ascii(ascii);
-}
-inline NSStringView viewOf(std::u16string_view text) {
+// A text that outgrew 32 bits while it was written is as good as memory that is not there.
+template <class Unit>
+NSStringView viewOf(std::basic_string_view<Unit> text) {
+  if (text.size() >= NSStringView::notFound) throw std::bad_alloc();
   return {text.data(), static_cast<uint32_t>(text.size())};
+}
+template <class Unit>
+NSStringView viewOf(const std::basic_string<Unit>& text) {
+  return viewOf(std::basic_string_view<Unit>(text));
 }
 
 }  // namespace xquery
