@@ -1,5 +1,7 @@
 #include "Platform/Curl.h"
 
+#include "Platform/WorkMeter.h"
+
 #include <curl/curl.h>
 
 #include <algorithm>
@@ -24,7 +26,8 @@ struct CleanUpEasy {
 };
 
 // One request. Exceptions do not cross libcurl's C frames: a callback notes what went wrong and
-// refuses its piece, which ends the transfer.
+// refuses its piece, which ends the transfer. What has come counts as memory while it is gathered,
+// so that the checkpoint sees a body that takes more than it may.
 class Transfer {
  public:
   explicit Transfer(const CurlRequest& request)
@@ -33,6 +36,7 @@ class Transfer {
   }
   ~Transfer() {
     if (_isAdded) curl_multi_remove_handle(_multi.get(), _easy.get());
+    uncountValueBytes(_countedBytes);
   }
   Transfer(const Transfer&) = delete;
   Transfer& operator=(const Transfer&) = delete;
@@ -56,6 +60,7 @@ class Transfer {
   bool _isAdded = false;
   CurlResponse _response;
   size_t _headerBytes = 0;
+  size_t _countedBytes = 0;
   bool _isTooLong = false;
   bool _isOutOfMemory = false;
   char _message[CURL_ERROR_SIZE] = {};
@@ -75,6 +80,8 @@ size_t Transfer::hearBody(char* bytes, size_t size, size_t count, void* self) {
     transfer._isOutOfMemory = true;
     return CURL_WRITEFUNC_ERROR;
   }
+  countValueBytes(length);
+  transfer._countedBytes += length;
   return length;
 }
 

@@ -42,12 +42,29 @@ bool hasLocalPath(const NSURL& URL, const std::string& path) {
          path.find('\0') == path.npos;
 }
 
+// What has been read counts as memory while it is gathered.
+class CountedBytes {
+ public:
+  CountedBytes() = default;
+  ~CountedBytes() { uncountValueBytes(_bytes); }
+  CountedBytes(const CountedBytes&) = delete;
+  CountedBytes& operator=(const CountedBytes&) = delete;
+  void add(size_t bytes) {
+    countValueBlock(bytes);
+    _bytes += bytes;
+  }
+
+ private:
+  size_t _bytes = 0;
+};
+
 constexpr const char* tooLong = "more bytes than allowed";
 
 std::optional<std::string> readAll(const Descriptor& file, uint64_t size, uint64_t mostBytes,
                                    std::string& failure) {
   std::string data;
   if (size <= mostBytes) data.reserve(size);
+  CountedBytes counted;
   char piece[65536];
   for (;;) {
     checkWork();
@@ -61,6 +78,7 @@ std::optional<std::string> readAll(const Descriptor& file, uint64_t size, uint64
       failure = tooLong;
       return std::nullopt;
     }
+    counted.add(static_cast<size_t>(count));
     data.append(piece, static_cast<size_t>(count));
   }
 }

@@ -290,6 +290,27 @@ TEST(Limits, CountTheMemoryOfDocuments) {
   EXPECT_EQ(evaluate(*context, "count(doc('http://h/a'))").error, ceilingReached);
 }
 
+// The document itself is small.
+TEST(Limits, CountTheBytesOfADocumentWhileTheyAreFetched) {
+  const std::string text = "<r/>" + std::string(32 * MiB, ' ');
+  const TestFolder folder;
+  HTTPServer server;
+  server.answer("/a.xml", "application/xml", text);
+  for (const std::string& URL : {folder.write("a.xml", text), server.URL("/a.xml")}) {
+    const auto context = XQueryContext::xqueryContext();
+    XQueryLimits limits;
+    limits.memoryCeiling = 8 * MiB;
+    context->contextSetLimits(limits);
+    const int64_t before = workMeter.valueBytes;
+    const std::string query = "count(doc('" + URL + "'))";
+    EXPECT_EQ(evaluate(*context, query).error, ceilingReached) << URL;
+    EXPECT_LE(workMeter.valueBytes, before + limitstest::keptByAContext) << URL;
+    limits.memoryCeiling = 48 * MiB;
+    context->contextSetLimits(limits);
+    EXPECT_EQ(evaluate(*context, query).result, "1") << URL;
+  }
+}
+
 TEST(Limits, DoNotLeaveADocumentInTheCacheAsMissing) {
   const auto context = contextWithLoader(
       std::make_shared<Supply>("<r>" + repeated("<e a='1'>text</e>", 200000) + "</r>"));
