@@ -116,6 +116,8 @@ Value XQuerySumShortcut(const Value& sequence) {
     if (item.form == XQueryNumericOperand::Other) return Value();
     if (isExact && item.form == XQueryNumericOperand::Exact) {
       exact = exact.add(*item.exact);
+      // The work of adding wide numbers is counted there, and may be a millisecond's.
+      if (!exact.isSmallInteger()) checkWork(0);
       isInteger = isInteger && item.isInteger;
       continue;
     }

@@ -1,6 +1,5 @@
 #include "Functions/FlatSet.h"
-
-#include <gtest/gtest.h>
+#include "Functions/FunctionsTesting.h"
 
 #include <functional>
 #include <random>
@@ -62,34 +61,12 @@ TEST(FlatSet, KeepsTheOrderOfInsertion) {
   EXPECT_EQ(keys, (std::vector<uint64_t>{5, 3, 9, 1}));
 }
 
-struct Ended {};
-
-// Ends the work of this thread at the given look.
-class Watcher final : public WorkWatcher {
- public:
-  explicit Watcher(int lastLook) : _looksLeft(lastLook) {
-    workMeter.stepsLeft = 1;
-    workMeter.watcher = this;
-  }
-  ~Watcher() {
-    workMeter.watcher = nullptr;
-    workMeter.stepsLeft = WorkMeter::manySteps;
-  }
-  void lookAtWork() override {
-    workMeter.stepsLeft = 1;
-    if (--_looksLeft == 0) throw Ended();
-  }
-
- private:
-  int _looksLeft;
-};
-
 TEST(FlatSet, VisitingCanBeEnded) {
   Numbers<UINT64_MAX> set;
   for (uint64_t key = 0; key < 10000; ++key) set.insert(key);
   size_t visited = 0;
-  const Watcher watcher(3);
-  EXPECT_THROW(set.forEach([&](uint64_t) { ++visited; }), Ended);
+  const functiontest::WorkEnder ender(3);
+  EXPECT_THROW(set.forEach([&](uint64_t) { ++visited; }), functiontest::WorkEnded);
   EXPECT_LT(visited, 4 * WorkPacer::turnsPerStep);
 }
 
@@ -98,8 +75,8 @@ TEST(FlatSet, GrowingCanBeEnded) {
   uint64_t key = 0;
   for (; key < 30000; ++key) set.insert(key);
   // Only a doubling looks: that of 65,536 slots 256 times.
-  const Watcher watcher(100);
-  EXPECT_THROW(while (key < 60000) set.insert(key++), Ended);
+  const functiontest::WorkEnder ender(100);
+  EXPECT_THROW(while (key < 60000) set.insert(key++), functiontest::WorkEnded);
   EXPECT_GT(key, 32000U);
   EXPECT_LT(key, 35000U);
 }

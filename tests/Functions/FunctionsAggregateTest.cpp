@@ -301,6 +301,17 @@ TEST(AggregateProperty, ShortcutsAnswerWhatTheDefinitionsDo) {
   EXPECT_GT(taken, 10000U);
 }
 
+TEST(AggregateShortcut, EachAdditionOfWideNumbersCanBeEnded) {
+  const std::string zeros(1000, '0');
+  const Value wide = decimal("1" + zeros);
+  const Value fine = decimal("0." + zeros + "1");
+  std::vector<Value> items;
+  for (int pair = 0; pair < 50; ++pair) items.insert(items.end(), {wide, fine});
+  const Value numbers = sequence(std::move(items));
+  const WorkEnder ender(90);
+  EXPECT_THROW(XQuerySumShortcut(numbers), WorkEnded);
+}
+
 TEST(AggregateShortcut, LeavesWhatItDoesNotKnow) {
   EXPECT_FALSE(XQuerySumShortcut(sequence({integer(1), string("1")})));
   EXPECT_FALSE(XQuerySumShortcut(sequence({integer(1), nan()})));

@@ -3,6 +3,7 @@
 
 #include "Expr/OperatorTestSupport.h"
 #include "Functions/XQueryBuiltInFunction.h"
+#include "Platform/WorkMeter.h"
 
 #include <gtest/gtest.h>
 
@@ -69,6 +70,29 @@ inline std::string answer(std::string_view query, const Value& contextItem = Val
   for (const Value& item : items->objects()) text += (text.empty() ? "" : ", ") + show(item);
   return text;
 }
+
+// Ends the work of this thread, by throwing WorkEnded, when it looks for the given time whether it
+// should end. Every step that is counted is followed by a look.
+struct WorkEnded {};
+
+class WorkEnder final : public WorkWatcher {
+ public:
+  explicit WorkEnder(int look) : _looksLeft(look) {
+    workMeter.stepsLeft = 1;
+    workMeter.watcher = this;
+  }
+  ~WorkEnder() {
+    workMeter.watcher = nullptr;
+    workMeter.stepsLeft = WorkMeter::manySteps;
+  }
+  void lookAtWork() override {
+    workMeter.stepsLeft = 1;
+    if (--_looksLeft == 0) throw WorkEnded();
+  }
+
+ private:
+  int _looksLeft;
+};
 
 inline Value document(std::string_view xml) {
   return NSXMLDocument::documentWithData(xml, NSXMLNodePreserveWhitespace);
