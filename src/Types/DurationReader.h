@@ -22,16 +22,17 @@ class DurationReader {
   }
   // Fails on more than 64 bits hold, with all the digits behind it.
   bool integer(int64_t& out) {
-    const NSStringView number = digits();
-    bool fits = !number.isEmpty();
+    const uint32_t from = _position;
+    bool fits = true;
     out = 0;
     WorkPacer pacer;
-    for (uint32_t index = 0; fits && index < number.length(); ++index) {
+    for (int64_t next = digit(); next >= 0; next = digit()) {
       pacer.turn();
-      fits = !__builtin_mul_overflow(out, int64_t{10}, &out) &&
-             !__builtin_add_overflow(out, int64_t{number[index] - '0'}, &out);
+      fits = fits && !__builtin_mul_overflow(out, int64_t{10}, &out) &&
+             !__builtin_add_overflow(out, next, &out);
+      ++_position;
     }
-    return fits;
+    return fits && _position > from;
   }
   // The digits after a "." that followed `whole`. They are read as an integer, so that their
   // leading zeros are lost: 1.05 reads as 1.5.
@@ -44,18 +45,25 @@ class DurationReader {
       pacer.turn();
       ++zeros;
     }
-    const std::string text = std::to_string(whole) + "." + number.substring(zeros).utf8();
+    std::string text = std::to_string(whole) + '.';
+    for (uint32_t index = zeros; index < number.length(); ++index) {
+      pacer.turn();
+      text += static_cast<char>(number[index]);
+    }
     return scanDouble(NSStringView::ascii(text), out);
   }
 
  private:
+  // The next character as a digit; negative when it is none.
+  int64_t digit() const {
+    const char16_t unit = atEnd() ? u' ' : _text[_position];
+    return unit >= u'0' && unit <= u'9' ? unit - u'0' : -1;
+  }
   // As many as there are, which may be none or millions.
   NSStringView digits() {
     const uint32_t from = _position;
     WorkPacer pacer;
-    for (; !atEnd() && _text[_position] >= '0' && _text[_position] <= '9'; ++_position) {
-      pacer.turn();
-    }
+    for (; digit() >= 0; ++_position) pacer.turn();
     return _text.substring(from, _position - from);
   }
 
