@@ -1,7 +1,5 @@
 // The public interface as a host program uses it: nothing but the installed headers.
-#include "xquery/xquery.h"
-
-#include <gtest/gtest.h>
+#include "Eval/EmbeddingTesting.h"
 
 #include <atomic>
 #include <string>
@@ -10,24 +8,6 @@
 
 namespace xquery {
 namespace {
-
-Value parse(std::string_view xml) {
-  NSXMLParseError failure;
-  Value document = NSXMLDocument::documentWithData(xml, NSXMLNodePreserveWhitespace, &failure);
-  EXPECT_TRUE(document) << failure.message;
-  return document;
-}
-
-// The items as the command prints them, one after another with a blank between.
-std::string strings(const Ref<NSArray>& items) {
-  if (!items) return "(no result)";
-  std::string all;
-  for (const Value& item : items->objects()) {
-    if (!all.empty()) all += ' ';
-    all += XQueryItemStringValue(*item);
-  }
-  return all;
-}
 
 std::string types(const Ref<NSArray>& items) {
   if (!items) return "(no result)";
@@ -38,23 +18,6 @@ std::string types(const Ref<NSArray>& items) {
   }
   return all;
 }
-
-class Embedding : public testing::Test {
- protected:
-  Ref<NSArray> evaluate(std::string_view source, const XQueryConstants& constants = {},
-                        const Value& item = Value()) {
-    const auto query = XQuery::xqueryWithSource(source);
-    return context->evaluateXQuery(*query, constants, item, &error);
-  }
-  // Number and message of the last error; empty without one.
-  std::string failure() const {
-    if (!error) return "";
-    return std::to_string(error->err()) + " " + (error->msg() ? error->msg()->utf8() : "(none)");
-  }
-
-  Ref<XQueryContext> context = XQueryContext::xqueryContext();
-  Ref<XQueryError> error;
-};
 
 // --- compile once, evaluate often ----------------------------------------------------------------
 

@@ -8,6 +8,8 @@
 #include "Eval/XQueryContextInternal.h"
 #include "Platform/HTTPServer.h"
 #include "Platform/LoadingTestSupport.h"
+#include "Platform/StackTestSupport.h"
+#include "Platform/TextTestSupport.h"
 #include "Platform/WorkMeter.h"
 
 #include <gtest/gtest.h>
@@ -153,13 +155,6 @@ const std::vector<Work>& longWork() {
       {"Names", "for $k in 1 to 1000000 for $e in //e return in-scope-prefixes($e)", Input::Deep},
   };
   return rows;
-}
-
-std::string repeated(std::string_view text, int count) {
-  std::string result;
-  result.reserve(text.size() * static_cast<size_t>(count));
-  for (int times = 0; times < count; ++times) result += text;
-  return result;
 }
 
 Ref<NSXMLDocument> parsed(const std::string& xml) {
@@ -610,7 +605,7 @@ constexpr const char* endless[] = {
 TEST(Limits, RecursionWithoutAnEndIsAnErrorOnEveryStack) {
   for (const size_t stack : {size_t{256} << 10, size_t{8} << 20}) {
     for (const char* query : endless) {
-      limitstest::onStack(stack, [&] {
+      onStack(stack, [&] {
         const auto context = XQueryContext::xqueryContext();
         EXPECT_EQ(evaluate(*context, query).error, tooDeep) << query;
         EXPECT_EQ(evaluate(*context, "1 + 1").result, "2");
@@ -620,7 +615,7 @@ TEST(Limits, RecursionWithoutAnEndIsAnErrorOnEveryStack) {
 }
 
 TEST(Limits, HoldOnSmallStacks) {
-  limitstest::onStack(size_t{256} << 10, [] {
+  onStack(size_t{256} << 10, [] {
     XQueryLimits limits;
     limits.duration = milliseconds(20);
     EXPECT_EQ(underLimits(limits, longWork()[0].query).error, deadlinePassed);

@@ -9,7 +9,6 @@
 #include <atomic>
 #include <chrono>
 #include <ctime>
-#include <functional>
 #include <memory>
 #include <pthread.h>
 #include <string>
@@ -110,21 +109,6 @@ void expectSoon(Attempt attempt, const std::string& error, milliseconds Outcome:
     least = std::min(least, outcome.*late);
   }
   EXPECT_LE(least, most);
-}
-
-// On a thread with a stack of that many bytes.
-inline void onStack(size_t bytes, std::function<void()> function) {
-  pthread_attr_t attributes;
-  pthread_attr_init(&attributes);
-  pthread_attr_setstacksize(&attributes, bytes);
-  pthread_t thread;
-  const auto run = [](void* argument) -> void* {
-    (*static_cast<std::function<void()>*>(argument))();
-    return nullptr;
-  };
-  ASSERT_EQ(pthread_create(&thread, &attributes, run, &function), 0);
-  pthread_attr_destroy(&attributes);
-  pthread_join(thread, nullptr);
 }
 
 }  // namespace xquery::limitstest

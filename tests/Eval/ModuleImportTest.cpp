@@ -1,48 +1,12 @@
 // Importing library modules through the public interface.
+#include "Eval/EmbeddingTesting.h"
 #include "Platform/LoadingTestSupport.h"
-#include "xquery/xquery.h"
-
-#include <gtest/gtest.h>
 
 #include <string>
 #include <vector>
 
 namespace xquery {
 namespace {
-
-Value parse(std::string_view xml) {
-  NSXMLParseError failure;
-  Value document = NSXMLDocument::documentWithData(xml, NSXMLNodePreserveWhitespace, &failure);
-  EXPECT_TRUE(document) << failure.message;
-  return document;
-}
-
-// The items' strings, one after another with a blank between.
-std::string strings(const Ref<NSArray>& items) {
-  if (!items) return "(no result)";
-  std::string all;
-  for (const Value& item : items->objects()) {
-    if (!all.empty()) all += ' ';
-    all += XQueryItemStringValue(*item);
-  }
-  return all;
-}
-
-class Embedding : public testing::Test {
- protected:
-  Ref<NSArray> evaluate(const std::string& source, const XQueryConstants& constants = {},
-                        const Value& item = Value()) {
-    const auto query = XQuery::xqueryWithSource(std::string_view(source));
-    return context->evaluateXQuery(*query, constants, item, &error);
-  }
-  std::string failure() const {
-    if (!error) return "";
-    return std::to_string(error->err()) + " " + (error->msg() ? error->msg()->utf8() : "(none)");
-  }
-
-  Ref<XQueryContext> context = XQueryContext::xqueryContext();
-  Ref<XQueryError> error;
-};
 
 // --- library modules -----------------------------------------------------------------------------
 

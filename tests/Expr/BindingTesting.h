@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Expr/OperatorTestSupport.h"
+#include "Expr/ProbeExpr.h"
 #include "Expr/XQueryFLWOR.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
@@ -27,36 +28,8 @@ inline Ref<NSString> text(std::string_view ascii) {
   return NSString::stringWithASCII(ascii);
 }
 
-// An expression that does what the test says.
-class ProbeExpr : public XQueryExpr {
- public:
-  using Evaluate = std::function<Value(XQueryContext&)>;
-  using Bind = std::function<void(XQueryProlog&)>;
-  ProbeExpr(Evaluate evaluate, Bind bind)
-      : XQueryExpr(Kind::OtherExpr), _evaluate(std::move(evaluate)), _bind(std::move(bind)) {}
-  void bindInfoForProlog(XQueryProlog& prolog) override {
-    if (_bind) _bind(prolog);
-  }
-  Value evaluateWithContext(XQueryContext& context) const override { return _evaluate(context); }
-
- private:
-  Evaluate _evaluate;
-  Bind _bind;
-};
-
-inline Ref<XQueryExpr> probe(ProbeExpr::Evaluate evaluate, ProbeExpr::Bind bind = {}) {
-  return make<ProbeExpr>(std::move(evaluate), std::move(bind));
-}
-inline Ref<XQueryExpr> always(Value value) {
-  return probe([value](XQueryContext&) { return value; });
-}
 inline Ref<XQueryExpr> onBind(ProbeExpr::Bind bind) {
   return probe([](XQueryContext&) -> Value { return NSNull::null(); }, std::move(bind));
-}
-inline Ref<XQueryExpr> failing(int64_t number = 6, std::string message = "invalid type") {
-  return probe([=](XQueryContext& context) -> Value {
-    context._internal().raise(XQueryError::error(number, message));
-  });
 }
 inline Ref<XQueryExpr> variable(std::string_view name) {
   return XQueryVariable::variableWithName(text(name));

@@ -14,13 +14,6 @@ namespace {
 
 using namespace operatortest;
 
-constexpr int Plus = XQueryOperatorPlus;
-constexpr int Minus = XQueryOperatorMinus;
-constexpr int Times = XQueryOperatorMultiply;
-constexpr int Div = XQueryOperatorDiv;
-constexpr int IDiv = XQueryOperatorIDiv;
-constexpr int Mod = XQueryOperatorMod;
-
 // One value of each type that matters here; arithmetic tells the numeric types apart by nothing but
 // being numeric.
 struct Operand {

@@ -21,6 +21,13 @@
 
 namespace xquery::operatortest {
 
+inline constexpr int Plus = XQueryOperatorPlus;
+inline constexpr int Minus = XQueryOperatorMinus;
+inline constexpr int Times = XQueryOperatorMultiply;
+inline constexpr int Div = XQueryOperatorDiv;
+inline constexpr int IDiv = XQueryOperatorIDiv;
+inline constexpr int Mod = XQueryOperatorMod;
+
 inline Value integer(int64_t value) {
   return XQueryNumber::integerWithInt64(value);
 }

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Eval/XQueryContextInternal.h"
+#include "Expr/ProbeExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Expr/XQueryNameTest.h"
@@ -27,34 +28,6 @@ inline Ref<NSString> text(std::string_view ascii) {
   return NSString::stringWithASCII(ascii);
 }
 
-// An expression that does what the test says.
-class ProbeExpr : public XQueryExpr {
- public:
-  using Evaluate = std::function<Value(XQueryContext&)>;
-  using Bind = std::function<void()>;
-  ProbeExpr(Evaluate evaluate, Bind bind)
-      : XQueryExpr(Kind::OtherExpr), _evaluate(std::move(evaluate)), _bind(std::move(bind)) {}
-  void bindInfoForProlog(XQueryProlog&) override {
-    if (_bind) _bind();
-  }
-  Value evaluateWithContext(XQueryContext& context) const override { return _evaluate(context); }
-
- private:
-  Evaluate _evaluate;
-  Bind _bind;
-};
-
-inline Ref<XQueryExpr> probe(ProbeExpr::Evaluate evaluate, ProbeExpr::Bind bind = {}) {
-  return make<ProbeExpr>(std::move(evaluate), std::move(bind));
-}
-inline Ref<XQueryExpr> always(Value value) {
-  return probe([value](XQueryContext&) { return value; });
-}
-inline Ref<XQueryExpr> failing(int64_t number = 6, std::string message = "invalid type") {
-  return probe([=](XQueryContext& context) -> Value {
-    context._internal().raise(XQueryError::error(number, message));
-  });
-}
 inline Ref<XQueryLiteral> integer(std::string_view digits) {
   return XQueryLiteral::integerLiteralWithString(text(digits));
 }

@@ -16,13 +16,6 @@ namespace {
 
 using namespace operatortest;
 
-constexpr int Plus = XQueryOperatorPlus;
-constexpr int Minus = XQueryOperatorMinus;
-constexpr int Times = XQueryOperatorMultiply;
-constexpr int Div = XQueryOperatorDiv;
-constexpr int IDiv = XQueryOperatorIDiv;
-constexpr int Mod = XQueryOperatorMod;
-
 // --- every pair of numeric types under every operator --------------------------------------------
 
 constexpr int numericTypes[] = {11, 12, 13, 42, 43, 44, 45, 46, 47, 48, 49, 50, 51, 52, 53, 54};

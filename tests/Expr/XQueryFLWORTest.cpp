@@ -1,10 +1,10 @@
 #include "Expr/BindingTesting.h"
 #include "Expr/XQueryFLWOR.h"
+#include "Platform/StackTestSupport.h"
 
 #include <gtest/gtest.h>
 
 #include <cstdint>
-#include <pthread.h>
 
 namespace xquery::bindingtest {
 namespace {
@@ -571,23 +571,11 @@ TEST_F(FLWOR, NestingInAClauseBeyondTheStackIsAnErrorOfTheQuery) {
   EXPECT_EQ(evaluated(*expr), tooDeep);
 }
 
-// Runs the work on a thread with a stack of a gibibyte, as the command does.
-void onLargeStack(std::function<void()> work) {
-  pthread_attr_t attributes;
-  pthread_attr_init(&attributes);
-  ASSERT_EQ(pthread_attr_setstacksize(&attributes, size_t{1} << 30), 0);
-  pthread_t thread;
-  const auto run = [](void* argument) -> void* {
-    (*static_cast<std::function<void()>*>(argument))();
-    return nullptr;
-  };
-  ASSERT_EQ(pthread_create(&thread, &attributes, run, &work), 0);
-  pthread_join(thread, nullptr);
-  pthread_attr_destroy(&attributes);
-}
+constexpr size_t largeStack = size_t{1} << 30;  // as the command has it
 
 TEST_F(FLWOR, AHundredThousandNestedOnesHaveAValueWhereTheStackIsLarge) {
-  onLargeStack([this] { EXPECT_EQ(outcomeOf(nestedFLWORs(100'000, integer(7))), "integer 7"); });
+  onStack(largeStack,
+          [this] { EXPECT_EQ(outcomeOf(nestedFLWORs(100'000, integer(7))), "integer 7"); });
 }
 
 TEST_F(FLWOR, AHundredThousandNestedOnesEndOnAnyStack) {
@@ -603,7 +591,7 @@ TEST_F(FLWOR, TenThousandForClausesHaveTheirTuples) {
     clauses.push_back(forClause("v" + std::to_string(i), always(integer(i))));
   }
   const auto expr = flwor(std::move(clauses), commas({variable("v0"), variable("v9999")}));
-  onLargeStack([&] { EXPECT_EQ(outcomeOf(expr), "(integer 0, integer 9999)"); });
+  onStack(largeStack, [&] { EXPECT_EQ(outcomeOf(expr), "(integer 0, integer 9999)"); });
   EXPECT_EQ(prolog->nextLocalVariableID(), 1);
 }
 

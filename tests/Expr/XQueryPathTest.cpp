@@ -226,7 +226,7 @@ TEST_F(Path, StepsAndPredicatesAreBoundInOrder) {
   std::string order;
   const auto noting = [&](char letter) {
     return probe([](XQueryContext&) -> Value { return NSNull::null(); },
-                 [&order, letter] { order += letter; });
+                 [&order, letter](XQueryProlog&) { order += letter; });
   };
   path({filterStep(noting('a'), {noting('b'), noting('c')}), filterStep(noting('d'))})
       ->bindInfoForProlog(*prolog);
@@ -235,8 +235,8 @@ TEST_F(Path, StepsAndPredicatesAreBoundInOrder) {
 
 TEST_F(Path, BindingStopsAtAMissingPredicate) {
   int bound = 0;
-  const auto counting =
-      probe([](XQueryContext&) -> Value { return NSNull::null(); }, [&] { ++bound; });
+  const auto counting = probe([](XQueryContext&) -> Value { return NSNull::null(); },
+                              [&](XQueryProlog&) { ++bound; });
   step(XQueryAxisChild, anyNode(), {counting, nullptr, counting})->bindInfoForProlog(*prolog);
   EXPECT_EQ(bound, 1);
 }

@@ -5,11 +5,11 @@
 #include "Functions/FunctionsString.h"
 #include "Functions/FunctionsTesting.h"
 #include "Functions/XQueryFunctionCall.h"
+#include "Platform/StackTestSupport.h"
 #include "Prolog/PrologTesting.h"
 
 #include <algorithm>
 #include <functional>
-#include <pthread.h>
 
 namespace xquery {
 namespace {
@@ -383,24 +383,9 @@ TEST(Recursion, AfterItsErrorTheContextWorksOn) {
 
 // What the query answers on a thread with a stack of that many bytes.
 std::string answerOnStack(size_t bytes, const std::string& query) {
-  struct Job {
-    const std::string& query;
-    std::string result;
-  } job{query, {}};
-  const auto run = [](void* argument) -> void* {
-    auto* theJob = static_cast<Job*>(argument);
-    theJob->result = answer(theJob->query);
-    return nullptr;
-  };
-  pthread_attr_t attributes;
-  pthread_attr_init(&attributes);
-  pthread_attr_setstacksize(&attributes, bytes);
-  pthread_t thread;
-  const int failure = pthread_create(&thread, &attributes, run, &job);
-  pthread_attr_destroy(&attributes);
-  if (failure != 0) return "no thread";
-  pthread_join(thread, nullptr);
-  return job.result;
+  std::string result;
+  onStack(bytes, [&] { result = answer(query); });
+  return result;
 }
 
 constexpr const char* counting =

@@ -3,6 +3,7 @@
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
 #include "Platform/ProcessorTime.h"
+#include "Platform/TextTestSupport.h"
 
 #include <gtest/gtest.h>
 
@@ -290,13 +291,6 @@ TEST(Parser, SeveralThreadsMayParse) {
 }
 
 // --- long and deep queries -----------------------------------------------------------------------
-
-std::string repeated(std::string_view text, size_t count) {
-  std::string result;
-  result.reserve(text.size() * count);
-  for (size_t index = 0; index < count; ++index) result += text;
-  return result;
-}
 
 TEST(Parser, NestingBeyondTheStackIsAClearError) {
   const auto parser = parsed(repeated("(", 100000) + "1" + repeated(")", 100000));

@@ -1,5 +1,6 @@
 #include "Platform/PCRE.h"
 #include "Platform/ProcessorTime.h"
+#include "Platform/TextTestSupport.h"
 #include "Platform/WorkMeter.h"
 
 #include <gtest/gtest.h>
@@ -11,13 +12,6 @@ namespace xquery {
 namespace {
 
 using Outcome = PCRESearch::Outcome;
-
-std::string repeated(std::string_view text, size_t count) {
-  std::string result;
-  result.reserve(text.size() * count);
-  for (size_t index = 0; index < count; ++index) result += text;
-  return result;
-}
 
 // "none", "failed", "bad pattern", or the ranges of the groups: "1-3 2-2 -".
 std::string search(std::string_view pattern, std::string_view subject, uint32_t options = PCREUTF8,

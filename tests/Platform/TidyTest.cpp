@@ -1,6 +1,7 @@
 // HTML, tidied and then parsed like any document.
 #include "Platform/LoadingTestSupport.h"
 #include "Platform/ProcessorTime.h"
+#include "Platform/TextTestSupport.h"
 #include "Platform/Tidy.h"
 #include "Platform/WorkMeter.h"
 #include "xquery/XMLNode.h"
@@ -150,12 +151,6 @@ std::string outcome(const std::string& HTML) {
   const auto document = NSXMLDocument::documentWithData(HTML, NSXMLDocumentTidyHTML, &error);
   EXPECT_LT(processorSeconds() - start, 60);
   return document ? "document" : error.message;
-}
-
-std::string repeated(std::string_view text, size_t count) {
-  std::string all;
-  for (size_t n = 0; n < count; ++n) all += text;
-  return all;
 }
 
 TEST(TidyHostile, DeepNestingIsReadOrRefused) {

@@ -11,12 +11,21 @@
 namespace command {
 namespace {
 
+// A file that already is at the stream's place, where that was closed, only has to stay open.
+void attach(int file, int stream) {
+  if (file == stream) {
+    fcntl(file, F_SETFD, 0);
+  } else {
+    dup2(file, stream);
+  }
+}
+
 // In the child: standard streams, then the program.
 [[noreturn]] void become(const std::string& program, const std::vector<std::string>& arguments,
                          int in, int out, int err) {
-  dup2(in, STDIN_FILENO);
-  dup2(out, STDOUT_FILENO);
-  dup2(err, STDERR_FILENO);
+  attach(in, STDIN_FILENO);
+  attach(out, STDOUT_FILENO);
+  attach(err, STDERR_FILENO);
   std::vector<char*> argv{const_cast<char*>(program.c_str())};
   for (const std::string& argument : arguments) argv.push_back(const_cast<char*>(argument.c_str()));
   argv.push_back(nullptr);
