@@ -3,6 +3,10 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <ostream>
+#include <string>
+#include <vector>
+
 using command::books;
 using command::Outcome;
 using command::TemporaryDirectory;
@@ -70,6 +74,11 @@ struct WrongUsage {
   std::vector<std::string> arguments;
   const char* complaint;
 };
+
+// What stands in the name that ctest shows: not addresses, which are others in each run.
+void PrintTo(const WrongUsage& usage, std::ostream* out) {
+  *out << usage.complaint;
+}
 
 class Usage : public testing::TestWithParam<WrongUsage> {};
 
