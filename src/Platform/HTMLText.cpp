@@ -65,6 +65,75 @@ std::string asUTF8(std::string_view bytes, const std::string& encoding) {
   return NSString::stringWithUTF8Replacing(bytes)->utf8();
 }
 
+// Reads as much of HTML as it takes to count the attributes of its tags.
+class TagReader {
+ public:
+  explicit TagReader(std::string_view HTML) : _HTML(HTML) {}
+
+  // Goes to the name of the next start tag.
+  bool next() {
+    for (_at = _HTML.find('<', _at); _at < _HTML.size(); _at = _HTML.find('<', _at)) {
+      ++_at;
+      if (_at < _HTML.size() && isLetter(_HTML[_at])) {
+        _name = _at;
+        return true;
+      }
+    }
+    return false;
+  }
+
+  // Goes to the end of the tag, or to the first attribute too many. Attributes need not have white
+  // space between them, but then they have quotes or slashes.
+  bool hasMoreAttributes(size_t count) {
+    bool afterGap = false;
+    bool afterEquals = false;
+    for (; _at < _HTML.size() && _HTML[_at] != '>'; ++_at) {
+      const char byte = _HTML[_at];
+      const bool isQuote = byte == '"' || byte == '\'';
+      if (isQuote && afterEquals) _at = endOfValue();
+      const bool isGap = isSpace(byte) || isQuote || byte == '/';
+      if (afterGap && !isGap && byte != '=' && !afterEquals && count-- == 0) return true;
+      afterGap = isGap;
+      if (!isSpace(byte)) afterEquals = byte == '=';
+    }
+    return false;
+  }
+
+  // There, what looks like a tag is a comparison of a program, and quotes are its texts.
+  void skipRawText() {
+    for (const std::string_view name : {std::string_view("script"), std::string_view("style")}) {
+      const std::string_view here = _HTML.substr(_name, name.size() + 1);
+      if (here.size() <= name.size() || isLetter(here.back())) continue;
+      if (lowerCase(here.substr(0, name.size())) == name) skipToEndTag(name);
+    }
+  }
+
+ private:
+  // The place of the quote that ends the value which begins here; here, where nothing ends it.
+  size_t endOfValue() {
+    const char quote = _HTML[_at];
+    size_t& last = quote == '"' ? _lastDouble : _lastSingle;
+    if (last == _HTML.npos) last = _HTML.rfind(quote);
+    return _at < last ? _HTML.find(quote, _at + 1) : _at;
+  }
+
+  void skipToEndTag(std::string_view name) {
+    for (size_t at = _HTML.find("</", _at); at != _HTML.npos; at = _HTML.find("</", at + 1)) {
+      if (lowerCase(_HTML.substr(at + 2, name.size())) == name) {
+        _at = at;
+        return;
+      }
+    }
+    _at = _HTML.size();
+  }
+
+  const std::string_view _HTML;
+  size_t _at = 0;
+  size_t _name = 0;
+  size_t _lastDouble = std::string_view::npos;
+  size_t _lastSingle = std::string_view::npos;
+};
+
 }  // namespace
 
 std::string HTMLAsUTF8(std::string_view bytes) {
@@ -81,18 +150,10 @@ std::string HTMLAsUTF8(std::string_view bytes) {
 }
 
 bool hasTagOfMoreAttributes(std::string_view HTML, size_t count) {
-  for (size_t start = HTML.find('<'); start != HTML.npos; start = HTML.find('<', start + 1)) {
-    if (start + 1 == HTML.size() || !isLetter(HTML[start + 1])) continue;
-    // Attributes need not have white space between them, but then they have quotes.
-    size_t gaps = 0;
-    size_t at = start + 1;
-    for (; at < HTML.size() && HTML[at] != '>'; ++at) {
-      const bool isGap =
-          isSpace(HTML[at]) || HTML[at] == '"' || HTML[at] == '\'' || HTML[at] == '/';
-      const bool isFirst = isGap && HTML[at] != HTML[at - 1];
-      if (isFirst && ++gaps > count) return true;
-    }
-    start = at == HTML.size() ? at - 1 : at;
+  TagReader tags(HTML);
+  while (tags.next()) {
+    if (tags.hasMoreAttributes(count)) return true;
+    tags.skipRawText();
   }
   return false;
 }

@@ -11,7 +11,8 @@ namespace xquery {
 // are that, else Windows-1252.
 std::string HTMLAsUTF8(std::string_view bytes);
 
-// Whether a tag may hold more attributes than that. An estimate from above.
+// Whether a tag has more attributes than that. Values in quotes count for nothing, nor do scripts
+// and style sheets. HTML that is malformed on purpose can be read in another way than here.
 bool hasTagOfMoreAttributes(std::string_view HTML, size_t count);
 
 }  // namespace xquery

@@ -1,6 +1,7 @@
 #include "Platform/LibXSLT.h"
 
 #include "Platform/LibXMLTree.h"
+#include "Platform/WorkerThread.h"
 #include "Platform/WorkMeter.h"
 
 #include <libxml/globals.h>
@@ -20,7 +21,6 @@
 #include <atomic>
 #include <chrono>
 #include <condition_variable>
-#include <csignal>
 #include <cstdarg>
 #include <cstdio>
 #include <cstdlib>
@@ -96,7 +96,6 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
   void stop();  // under the lock
 
   // On the calling thread.
-  bool startThread(pthread_t& thread);
   // Whether the thread is done; otherwise it is left behind.
   bool attend();
   void look(Request* request);
@@ -384,21 +383,6 @@ Transformation::Transformation(const LibXSLTTask& task)
   _failure.reserve(longestFailure);
 }
 
-// The handlers of the host's signals are not run on this thread.
-bool Transformation::startThread(pthread_t& thread) {
-  pthread_attr_t attributes;
-  if (pthread_attr_init(&attributes) != 0) return false;
-  sigset_t all;
-  sigset_t before;
-  sigfillset(&all);
-  pthread_sigmask(SIG_SETMASK, &all, &before);
-  const bool isStarted = pthread_attr_setstacksize(&attributes, stackBytes) == 0 &&
-                         pthread_create(&thread, &attributes, start, this) == 0;
-  pthread_sigmask(SIG_SETMASK, &before, nullptr);
-  pthread_attr_destroy(&attributes);
-  return isStarted;
-}
-
 bool Transformation::attend() {
   using Clock = std::chrono::steady_clock;
   Clock::time_point lastMoment = Clock::time_point::max();
@@ -482,7 +466,7 @@ Value Transformation::run(std::string& failure) {
   if (leftBehind.count >= LibXSLTMostLeftBehind) return nullptr;
   pthread_t thread;
   _self = shared_from_this();
-  if (!startThread(thread)) {
+  if (!startWorkerThread(thread, stackBytes, start, this)) {
     _self = nullptr;
     return nullptr;
   }

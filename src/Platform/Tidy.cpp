@@ -4,6 +4,10 @@
 // reaching one leaves libtidy by a jump out of the allocator, after which all it had is freed from
 // outside.
 //
+// Some of its loops ask for no memory, and a few of those take time that grows with the square of
+// what they work on. Whoever waits for the thread therefore leaves it behind when it comes to no
+// end, and what it works on is owned by both.
+//
 // What it makes of the HTML is not written by libtidy but here: as XML that is always well formed,
 // and without the line breaks that a pretty printer adds.
 #include "Platform/Tidy.h"
@@ -11,6 +15,7 @@
 #include "Platform/HTMLText.h"
 #include "Platform/ThreadClock.h"
 #include "Platform/UTF8.h"
+#include "Platform/WorkerThread.h"
 #include "Platform/WorkMeter.h"
 
 #include <algorithm>
@@ -21,6 +26,7 @@
 #include <cstdlib>
 #include <ctime>
 #include <exception>
+#include <memory>
 #include <mutex>
 #include <new>
 #include <pthread.h>
@@ -40,8 +46,13 @@ constexpr size_t mostMemoryPerByte = 64;
 // Of the processor; ten times what a large document takes.
 constexpr double mostSeconds = 2;
 constexpr double mostSecondsPerByte = 1e-6;
-// libtidy compares every attribute of a tag with every other, asking for no memory meanwhile.
+// Between the allocator's limit and the end of the wait.
+constexpr double patience = 1;
+constexpr int mostLeftBehind = 4;
+// libtidy compares every attribute of a tag with every other, asking for no memory meanwhile. HTML
+// that has so many is seldom meant well, so that a thread is not spent on it.
 constexpr size_t mostAttributes = 5'000;
+constexpr const char* tooMuchTime = "HTML takes too much time";
 
 // --- the allocator -------------------------------------------------------------------------------
 
@@ -58,6 +69,7 @@ class Allocator {
 
   TidyAllocator* forTidy() { return &_shell.tidy; }
   const char* failure() const { return _failure; }
+  double allowedSeconds() const { return _mostSeconds; }
   // From another thread: the next request for memory is a limit reached.
   void abandon() { _isAbandoned.store(true, std::memory_order_relaxed); }
   // Calls `function`, which is left by a jump when a limit is reached: on its way to libtidy
@@ -95,12 +107,12 @@ class Allocator {
     std::longjmp(_exit, 1);
   }
   void check(size_t more) {
-    if (_isAbandoned.load(std::memory_order_relaxed)) leave("nobody waits for the HTML");
+    if (_isAbandoned.load(std::memory_order_relaxed)) leave(tooMuchTime);
     if (_stackStart - here() > usableStack) leave("HTML nested too deeply");
     if (more > _mostBytes - std::min(_bytes, _mostBytes)) leave("HTML takes too much memory");
     constexpr unsigned betweenClocks = 256;
     if (++_calls % betweenClocks == 0 && threadSeconds() > _mostSeconds) {
-      leave("HTML takes too much time");
+      leave(tooMuchTime);
     }
   }
   void link(Block* block) {
@@ -385,27 +397,36 @@ void Writer::comment(std::string_view utf8) {
 
 // --- the whole -----------------------------------------------------------------------------------
 
-class Conversion {
+// Threads that nobody waits for any more. Each ends with its next request for memory.
+std::atomic<int> leftBehind = 0;
+
+// Owned by the caller and by the thread that does the work, whichever lives longer.
+class Conversion : public std::enable_shared_from_this<Conversion> {
  public:
   explicit Conversion(std::string HTML) : _HTML(std::move(HTML)), _allocator(_HTML.size()) {}
 
-  // On a thread of its own; answers whether there is one to be had. The evaluation that waits for
-  // it may be ended meanwhile, by an exception.
-  bool runOnOwnStack();
-  std::optional<std::string> result(std::string& failure);
+  // The evaluation that waits for it may be ended meanwhile, by an exception.
+  std::optional<std::string> XHTML(std::string& failure);
 
  private:
   static void* start(void* self);
-  bool waitFor(pthread_t thread);
   void run();
   void configure();
 
+  // On the calling thread. Whether the other has ended; otherwise it is left behind.
+  bool waitFor(pthread_t thread);
+  bool leave(pthread_t thread);
+  // On either, for the second that comes.
+  void partFrom();
+
   const std::string _HTML;
   Allocator _allocator;
+  std::shared_ptr<Conversion> _self;  // for the thread to take
   TidyDoc _document = nullptr;
   std::string _XHTML;
   bool _isDone = false;
   std::exception_ptr _exception;
+  std::atomic<bool> _isParted = false;
 };
 
 // libtidy settles its language, which is one for all documents, when a document is made.
@@ -453,50 +474,69 @@ void Conversion::run() {
 }
 
 void* Conversion::start(void* self) {
-  auto& conversion = *static_cast<Conversion*>(self);
+  const auto conversion = std::move(static_cast<Conversion*>(self)->_self);
   try {
-    conversion.run();
+    conversion->run();
   } catch (...) {
-    conversion._exception = std::current_exception();
+    conversion->_exception = std::current_exception();
   }
+  conversion->partFrom();
   return nullptr;
 }
 
-// The thread works on this object, so it has ended whenever this returns or throws.
-bool Conversion::waitFor(pthread_t thread) {
-  constexpr long lookNanoseconds = 10'000'000;
+// Whether the thread has ended, now or soon.
+bool joinSoon(pthread_t thread) {
+  constexpr long soonNanoseconds = 10'000'000;
   constexpr long second = 1'000'000'000;
+  timespec time = {};
+  ::clock_gettime(CLOCK_MONOTONIC, &time);
+  time.tv_nsec += soonNanoseconds;
+  if (time.tv_nsec >= second) {
+    time.tv_sec += 1;
+    time.tv_nsec -= second;
+  }
+  return pthread_clockjoin_np(thread, nullptr, CLOCK_MONOTONIC, &time) != ETIMEDOUT;
+}
+
+bool Conversion::waitFor(pthread_t thread) {
+  clockid_t processor = CLOCK_THREAD_CPUTIME_ID;
+  ::pthread_getcpuclockid(thread, &processor);
   try {
-    for (;;) {
-      timespec time = {};
-      ::clock_gettime(CLOCK_MONOTONIC, &time);
-      time.tv_nsec += lookNanoseconds;
-      if (time.tv_nsec >= second) {
-        time.tv_sec += 1;
-        time.tv_nsec -= second;
-      }
-      const int failure = pthread_clockjoin_np(thread, nullptr, CLOCK_MONOTONIC, &time);
-      if (failure != ETIMEDOUT) return failure == 0;
+    while (!joinSoon(thread)) {
       lookAtWork();
+      if (threadSeconds(processor) > _allocator.allowedSeconds() + patience) return leave(thread);
     }
+    return true;
   } catch (...) {
-    _allocator.abandon();
-    pthread_join(thread, nullptr);
+    leave(thread);
     throw;
   }
 }
 
-bool Conversion::runOnOwnStack() {
-  pthread_attr_t attributes;
-  pthread_t thread;
-  pthread_attr_init(&attributes);
-  pthread_attr_setstacksize(&attributes, stackSize);
-  const int failure = pthread_create(&thread, &attributes, &Conversion::start, this);
-  pthread_attr_destroy(&attributes);
-  return failure == 0 && waitFor(thread);
+bool Conversion::leave(pthread_t thread) {
+  _allocator.abandon();
+  if (joinSoon(thread)) return true;
+  ++leftBehind;
+  partFrom();
+  pthread_detach(thread);
+  return false;
 }
 
-std::optional<std::string> Conversion::result(std::string& failure) {
+void Conversion::partFrom() {
+  if (_isParted.exchange(true)) --leftBehind;
+}
+
+std::optional<std::string> Conversion::XHTML(std::string& failure) {
+  pthread_t thread;
+  failure = "no thread to read HTML on";
+  if (leftBehind >= mostLeftBehind) return std::nullopt;
+  _self = shared_from_this();
+  if (!startWorkerThread(thread, stackSize, start, this)) {
+    _self = nullptr;
+    return std::nullopt;
+  }
+  failure = tooMuchTime;
+  if (!waitFor(thread)) return std::nullopt;
   if (_exception) std::rethrow_exception(_exception);
   if (_isDone && !_XHTML.empty()) return std::move(_XHTML);
   failure = *_allocator.failure() ? _allocator.failure() : "HTML cannot be read";
@@ -515,12 +555,7 @@ std::optional<std::string> XHTMLFromHTML(std::string_view bytes, std::string& fa
     failure = "HTML with a tag of too many attributes";
     return std::nullopt;
   }
-  Conversion conversion(std::move(HTML));
-  if (!conversion.runOnOwnStack()) {
-    failure = "no thread to read HTML on";
-    return std::nullopt;
-  }
-  return conversion.result(failure);
+  return std::make_shared<Conversion>(std::move(HTML))->XHTML(failure);
 }
 
 }  // namespace xquery

@@ -1,4 +1,5 @@
 #include "Platform/HTMLText.h"
+#include "Platform/ProcessorTime.h"
 
 #include <gtest/gtest.h>
 
@@ -50,15 +51,50 @@ TEST(HTMLText, OnlyTheFirstKilobyteNamesTheEncoding) {
   EXPECT_EQ(HTMLAsUTF8(outside + "\xC1"), outside + "\xC3\x81");
 }
 
-TEST(HTMLText, AttributesOfOneTagAreCountedFromAbove) {
+TEST(HTMLText, AttributesOfOneTagAreCounted) {
   EXPECT_FALSE(hasTagOfMoreAttributes("<p a b c><p a b c>", 3));
   EXPECT_TRUE(hasTagOfMoreAttributes("<p a b c d>", 3));
   EXPECT_TRUE(hasTagOfMoreAttributes("x<y>z<p a='1'b='2'c='3'd='4'", 3));
+  EXPECT_FALSE(hasTagOfMoreAttributes("<p a='1' b = \"2\" c= 3 >", 3));
   EXPECT_TRUE(hasTagOfMoreAttributes("<p/a/b/c/d", 3));
   EXPECT_FALSE(hasTagOfMoreAttributes("", 3));
   EXPECT_FALSE(hasTagOfMoreAttributes("<", 3));
   EXPECT_FALSE(hasTagOfMoreAttributes("a < b c d e f g h", 3));
   EXPECT_FALSE(hasTagOfMoreAttributes("<p     a     b>", 3));
+}
+
+TEST(HTMLText, ValuesInQuotesAreNoAttributesAndEndNoTag) {
+  EXPECT_FALSE(hasTagOfMoreAttributes("<p a='b c d e \" f/g/h'>", 3));
+  EXPECT_FALSE(hasTagOfMoreAttributes("<p a=\"{'b': 'c', 'd': 'e'}\" f = ' g h i j '>", 3));
+  EXPECT_TRUE(hasTagOfMoreAttributes("<p a='>' b=\">\" c='>' d='>'>", 3));
+  EXPECT_TRUE(hasTagOfMoreAttributes("<p a=' b c d e", 3)) << "a quote that nothing ends";
+  EXPECT_FALSE(hasTagOfMoreAttributes("<p a=' b c d e'", 3));
+}
+
+TEST(HTMLText, ScriptsAndStyleSheetsHaveNoTags) {
+  const std::string comparison = "if(i<e)x={'a':'b','c':'d', 'e':'f'}";
+  EXPECT_TRUE(hasTagOfMoreAttributes(comparison, 3));
+  EXPECT_FALSE(hasTagOfMoreAttributes("<script>" + comparison + "</script>", 3));
+  EXPECT_FALSE(hasTagOfMoreAttributes("<SCRIPT type='a'>" + comparison + "</b></Script><p>", 3));
+  EXPECT_FALSE(hasTagOfMoreAttributes("<style>" + comparison, 3));
+  EXPECT_TRUE(hasTagOfMoreAttributes("<script></script>" + comparison, 3));
+  EXPECT_TRUE(hasTagOfMoreAttributes("<scripts>" + comparison, 3));
+  EXPECT_TRUE(hasTagOfMoreAttributes("<script a b c d></script>", 3));
+}
+
+TEST(HTMLText, CountingTakesTimeInProportion) {
+  const auto measure = [](std::string_view piece) {
+    return [piece](size_t size) {
+      std::string HTML;
+      while (HTML.size() < size) HTML += piece;
+      const double start = processorSeconds();
+      EXPECT_FALSE(hasTagOfMoreAttributes(HTML, size));
+      return processorSeconds() - start;
+    };
+  };
+  for (const char* piece : {"<p a='", "<p a=\"b'", "<script></", "<script></script>", "<p "}) {
+    EXPECT_TRUE(growsInProportion(measure(piece), 1'000'000)) << piece;
+  }
 }
 
 }  // namespace

@@ -1,12 +1,11 @@
 // Stylesheets and documents that would nest, work or grow without end, and the threads they run on.
 #include "Platform/LibXSLT.h"
 #include "Platform/StylesheetTestSupport.h"
+#include "Platform/ThreadTestSupport.h"
 #include "Platform/WorkMeter.h"
 
 #include <chrono>
 #include <cstdlib>
-#include <filesystem>
-#include <iterator>
 #include <string>
 #include <thread>
 #include <vector>
@@ -140,17 +139,6 @@ std::string slowToCompile(int templates) {
     content += "<xsl:template match='a' priority='" + std::to_string(-index) + "'/>";
   }
   return stylesheet(content);
-}
-
-ptrdiff_t threadCount() {
-  return std::distance(std::filesystem::directory_iterator("/proc/self/task"), {});
-}
-
-// Until what other tests left behind is done as well.
-void waitForTheLastThread() {
-  for (int turn = 0; turn < 6000 && threadCount() > 1; ++turn) {
-    std::this_thread::sleep_for(std::chrono::milliseconds(10));
-  }
 }
 
 TEST(LibXSLT, IsLeftBehindWhereItCannotBeStopped) {

@@ -2,6 +2,7 @@
 #include "Platform/LoadingTestSupport.h"
 #include "Platform/ProcessorTime.h"
 #include "Platform/TextTestSupport.h"
+#include "Platform/ThreadTestSupport.h"
 #include "Platform/Tidy.h"
 #include "Platform/WorkMeter.h"
 #include "xquery/XMLNode.h"
@@ -180,6 +181,31 @@ TEST(TidyHostile, ATagOfVeryManyAttributesIsRefused) {
   EXPECT_EQ(outcome(tag + ">"), "document");
   for (int n = 0; n < 50'000; ++n) tag += " b" + std::to_string(n) + "=1";
   EXPECT_EQ(outcome(tag + ">"), "HTML with a tag of too many attributes");
+}
+
+TEST(TidyHostile, AttributesThatLookLikeSeveralTagsAreCountedTogether) {
+  std::string tag = "<p";
+  for (int n = 0; n < 50'000; ++n) tag += " a" + std::to_string(n) + "='>'";
+  EXPECT_EQ(outcome(tag + ">"), "HTML with a tag of too many attributes");
+}
+
+TEST(TidyHostile, ScriptsAndValuesOfManyWordsAreNoAttributes) {
+  std::string pairs;
+  for (int n = 0; n < 20'000; ++n) pairs += "\"a\": \"b\", ";
+  EXPECT_EQ(outcome("<script>if(i<e)x={" + pairs + "}</script><p>y"), "document");
+  EXPECT_EQ(outcome("<div data-page='{" + pairs + "}'>y</div>"), "document");
+}
+
+// Where libtidy takes quotes for parts of a value without quotes, what counts attributes takes them
+// for quotes. Comparing so many long names takes half a minute.
+TEST(TidyHostile, AReadingThatComesToNoEndIsLeftBehind) {
+  waitForTheLastThread();
+  const std::string name(200, 'x');
+  std::string tag = "<i a==\"><p";
+  for (int n = 0; n < 25'000; ++n) tag += " " + name + std::to_string(n) + "=1";
+  EXPECT_EQ(outcome(tag + ">\">"), "HTML takes too much time");
+  EXPECT_GT(threadCount(), 1);
+  EXPECT_EQ(outcome("<p>x"), "document");
 }
 
 TEST(TidyHostile, LongTextsAreRead) {
