@@ -4,7 +4,8 @@
 // own. A context is for one thread at a time. Compilations are serialised by one lock.
 //
 // Failures are handed back as XQueryError objects; the engine throws nothing at its caller. What a
-// host's own client throws passes through.
+// host's own client throws passes through, and so does what ends an evaluation at one of its limits
+// while the client compiles or evaluates another query in it: clients let that pass too.
 #pragma once
 
 #include "xquery/Collection.h"

@@ -93,10 +93,9 @@ class XQueryContextInternal {
   // How many nodes have ever been recorded, those that are gone included.
   size_t baseURINodeCount() const { return _baseURINodeCount; }
 
-  // --- documents and bodies
-  // ------------------------------------------------------------------------ What the URL names,
-  // parsed as XML or HTML without text of white space only; NSNull when it cannot be had. Fetched
-  // once: the first answer, a failure included, is the answer for good.
+  // --- documents and bodies ----------------------------------------------------------------------
+  // What the URL names, parsed as XML or HTML without text of white space only; NSNull when it
+  // cannot be had. Fetched once: the first answer, a failure included, is the answer for good.
   Value XQueryDocumentForURL(const Ref<NSURL>& URL);
   // The raw bytes; null when they cannot be had. What was loaded as a document, or could not be,
   // has none.

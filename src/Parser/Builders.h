@@ -15,8 +15,7 @@
 
 namespace xquery {
 
-// --- modules and prolog (BuildersProlog.cpp)
-// -------------------------------------------------------
+// --- modules and prolog (BuildersProlog.cpp) -----------------------------------------------------
 
 NSObject* XQMainModule(NSObject* version, NSObject* prologItems, NSObject* body);
 NSObject* XQLibraryModule(NSObject* version, NSObject* moduleNamespace, NSObject* prologItems);
@@ -54,8 +53,7 @@ NSObject* XQParam(NSObject* name, NSObject* type, int64_t line);
 NSObject* XQParamList(NSObject* param);
 NSObject* XQParamListAdd(NSObject* params, NSObject* param);
 
-// --- expressions (BuildersExpressions.cpp)
-// -----------------------------------------------------------
+// --- expressions (BuildersExpressions.cpp) -------------------------------------------------------
 
 NSObject* XQExpr(NSObject* expr, int64_t line);
 NSObject* XQExprAdd(NSObject* list, NSObject* expr);
@@ -117,8 +115,7 @@ int XQOperatorType(NSObject* expr);
 int64_t XQExprLine(NSObject* expr);
 NSObject* XQExprSetLine(NSObject* expr, int64_t line);
 
-// --- paths (BuildersPaths.cpp)
-// -----------------------------------------------------------------------
+// --- paths (BuildersPaths.cpp) -------------------------------------------------------------------
 
 // A lone filter step without predicates is its own expression.
 NSObject* XQRelativePath(NSObject* firstStep, int64_t line);
@@ -135,8 +132,7 @@ NSObject* XQLocalName(NSObject* name, int64_t line);
 // A null prefix means any namespace, a null local name any name.
 NSObject* XQWildCardNameTest(NSObject* prefix, NSObject* localName, int64_t line);
 
-// --- types (BuildersTypes.cpp)
-// -----------------------------------------------------------------------
+// --- types (BuildersTypes.cpp) -------------------------------------------------------------------
 
 // "*" in a kind test is no name test at all.
 NSObject* XQNodeNameWildCard();
@@ -157,8 +153,7 @@ NSObject* XQSequenceTypeEmpty(int64_t line);
 NSObject* XQSingleType(NSObject* type, int occurrenceToken);
 NSObject* XQSequenceType(NSObject* type, int occurrenceToken);
 
-// --- constructors (BuildersConstructors.cpp)
-// -----------------------------------------------------------
+// --- constructors (BuildersConstructors.cpp) -----------------------------------------------------
 
 NSObject* XQElementConstructor(NSObject* name, NSObject* attributes, NSObject* content,
                                int64_t line);

@@ -94,8 +94,7 @@ class XQueryParser : public NSCounted {
 // The value of the last grammar run; owned by the current parser's pool.
 extern NSObject* yyparse_result;
 
-// --- what the scanner and the grammar call; each works on the current parser
-// -----------------------
+// --- what the scanner and the grammar call; each works on the current parser ---------------------
 
 size_t XQueryParserReadChars(char* buffer, size_t maxBytes);
 // A string owned by the parser's pool. The name lacks its "r".

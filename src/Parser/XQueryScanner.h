@@ -64,8 +64,7 @@ int SetTokenValues(int token, int line, char16_t unit, std::string_view text);
 // The text of the current token; empty at the end of the input.
 std::string_view XQScannerTokenText();
 
-// --- character conversions
-// -------------------------------------------------------------------------
+// --- character conversions -----------------------------------------------------------------------
 
 // "&#65;" and "&#x41;"; 0 for an empty reference and for a character outside the BMP, which these
 // references are knowingly too narrow for.
@@ -79,8 +78,7 @@ int UniCodeToUTF8(char16_t codeUnit, char* out);
 // The whole text, decoded.
 void XQAppendUTF8(NSMutableString& to, std::string_view bytes);
 
-// --- logging
-// ---------------------------------------------------------------------------------------
+// --- logging -------------------------------------------------------------------------------------
 
 // Switched by the environment at the first scan of the process.
 extern bool sXQueryLogTokens;

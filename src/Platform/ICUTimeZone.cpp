@@ -80,8 +80,7 @@ LibraryZone libraryZone(icu::TimeZone* zone) {
   return LibraryZone(static_cast<icu::BasicTimeZone*>(zone));
 }
 
-// --- rules in the POSIX form: CET-1CEST,M3.5.0,M10.5.0/3
-// -------------------------------------------
+// --- rules in the POSIX form: CET-1CEST,M3.5.0,M10.5.0/3 -----------------------------------------
 
 class RuleReader {
  public:

@@ -66,8 +66,7 @@ TEST(ExitStatus, APathWithoutAContextItemIsOne) {
   EXPECT_THAT(outcome.err, StartsWith("XQueryError:"));
 }
 
-// --- wrong usage
-// ----------------------------------------------------------------------------------
+// --- wrong usage ---------------------------------------------------------------------------------
 
 struct WrongUsage {
   const char* name;
@@ -108,8 +107,7 @@ INSTANTIATE_TEST_SUITE_P(
                     WrongUsage{"RepeatNoNumber", {"--repeat", "often", "-e", "1"}, "--repeat"}),
     [](const auto& parameter) { return parameter.param.name; });
 
-// --- input that cannot be read or parsed
-// ----------------------------------------------------------
+// --- input that cannot be read or parsed ---------------------------------------------------------
 
 TEST(ExitStatus, AMissingQueryFileIsThree) {
   const Outcome outcome = xquery({"/nowhere/query.xq"});
@@ -200,8 +198,7 @@ TEST(ExitStatus, AMissingDocumentForAVariableIsThree) {
   EXPECT_THAT(outcome.err, HasSubstr("/nowhere/d.xml"));
 }
 
-// --- output that cannot be written
-// ----------------------------------------------------------------
+// --- output that cannot be written ---------------------------------------------------------------
 
 TEST(ExitStatus, AClosedOutputPipeIsReportedAndIsThree) {
   const Outcome outcome =
