@@ -20,11 +20,11 @@
 
 #include <algorithm>
 #include <atomic>
-#include <cerrno>
+#include <chrono>
+#include <condition_variable>
 #include <csetjmp>
 #include <cstdint>
 #include <cstdlib>
-#include <ctime>
 #include <exception>
 #include <memory>
 #include <mutex>
@@ -413,11 +413,11 @@ class Conversion : public std::enable_shared_from_this<Conversion> {
   void run();
   void configure();
 
-  // On the calling thread. Whether the other has ended; otherwise it is left behind.
+  // On the calling thread. Whether the other has ended, and is joined.
+  bool endsSoon(pthread_t thread);
+  // Likewise; otherwise it is left behind.
   bool waitFor(pthread_t thread);
   bool leave(pthread_t thread);
-  // On either, for the second that comes.
-  void partFrom();
 
   const std::string _HTML;
   Allocator _allocator;
@@ -426,7 +426,10 @@ class Conversion : public std::enable_shared_from_this<Conversion> {
   std::string _XHTML;
   bool _isDone = false;
   std::exception_ptr _exception;
-  std::atomic<bool> _isParted = false;
+  std::mutex _mutex;
+  std::condition_variable _changed;
+  bool _hasEnded = false;
+  bool _isLeftBehind = false;
 };
 
 // libtidy settles its language, which is one for all documents, when a document is made.
@@ -480,29 +483,28 @@ void* Conversion::start(void* self) {
   } catch (...) {
     conversion->_exception = std::current_exception();
   }
-  conversion->partFrom();
+  const std::lock_guard lock(conversion->_mutex);
+  conversion->_hasEnded = true;
+  if (conversion->_isLeftBehind) --leftBehind;
+  conversion->_changed.notify_one();
   return nullptr;
 }
 
-// Whether the thread has ended, now or soon.
-bool joinSoon(pthread_t thread) {
-  constexpr long soonNanoseconds = 10'000'000;
-  constexpr long second = 1'000'000'000;
-  timespec time = {};
-  ::clock_gettime(CLOCK_MONOTONIC, &time);
-  time.tv_nsec += soonNanoseconds;
-  if (time.tv_nsec >= second) {
-    time.tv_sec += 1;
-    time.tv_nsec -= second;
+bool Conversion::endsSoon(pthread_t thread) {
+  constexpr auto soon = std::chrono::milliseconds(10);
+  {
+    std::unique_lock lock(_mutex);
+    if (!_changed.wait_for(lock, soon, [this] { return _hasEnded; })) return false;
   }
-  return pthread_clockjoin_np(thread, nullptr, CLOCK_MONOTONIC, &time) != ETIMEDOUT;
+  pthread_join(thread, nullptr);
+  return true;
 }
 
 bool Conversion::waitFor(pthread_t thread) {
   clockid_t processor = CLOCK_THREAD_CPUTIME_ID;
   ::pthread_getcpuclockid(thread, &processor);
   try {
-    while (!joinSoon(thread)) {
+    while (!endsSoon(thread)) {
       lookAtWork();
       if (threadSeconds(processor) > _allocator.allowedSeconds() + patience) return leave(thread);
     }
@@ -515,15 +517,12 @@ bool Conversion::waitFor(pthread_t thread) {
 
 bool Conversion::leave(pthread_t thread) {
   _allocator.abandon();
-  if (joinSoon(thread)) return true;
-  ++leftBehind;
-  partFrom();
+  if (endsSoon(thread)) return true;
+  const std::lock_guard lock(_mutex);
+  _isLeftBehind = !_hasEnded;
+  if (_isLeftBehind) ++leftBehind;
   pthread_detach(thread);
   return false;
-}
-
-void Conversion::partFrom() {
-  if (_isParted.exchange(true)) --leftBehind;
 }
 
 std::optional<std::string> Conversion::XHTML(std::string& failure) {
