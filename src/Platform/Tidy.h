@@ -11,7 +11,8 @@ namespace xquery {
 // is left out. Elements are in the XHTML namespace, svg and math and what is in them in their own.
 // The encoding is the one that a signature or the text itself tells, else UTF-8 or, for what is not
 // that, Windows-1252. Nothing, and why in `failure`, for a text that nests too deeply (tens of
-// thousands of levels) or would take time or memory out of all proportion.
+// thousands of levels), has a tag of more than some thousand attributes or would take time or
+// memory out of all proportion, and while several such readings are still to end.
 std::optional<std::string> XHTMLFromHTML(std::string_view bytes, std::string& failure);
 
 }  // namespace xquery

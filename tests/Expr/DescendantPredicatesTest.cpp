@@ -1,11 +1,11 @@
 // "//a[...]" walks the descendants in place of the children of each of them where its predicates
 // cannot tell. Here it is compared with the same path whose predicates could, over generated trees.
+#include "Expr/RandomChoices.h"
 #include "Functions/FunctionsTesting.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>
 
-#include <random>
 #include <string>
 #include <vector>
 
@@ -14,16 +14,9 @@ namespace {
 
 using functiontest::answer;
 
-class Generator {
+class Generator : public RandomChoices {
  public:
-  explicit Generator(unsigned seed) : _random(seed) {}
-
-  size_t below(size_t bound) {
-    return std::uniform_int_distribution<size_t>(0, bound - 1)(_random);
-  }
-  std::string oneOf(const std::vector<std::string>& choices) {
-    return choices[below(choices.size())];
-  }
+  using RandomChoices::RandomChoices;
 
   std::string element(size_t depth) {
     const std::string name = oneOf({"a", "b", "c"});
@@ -53,9 +46,6 @@ class Generator {
                   "some $x in * satisfies $x = '1'", "(a, b)", "(@k, 1)[1]", "*/(1)", "*/count(a)",
                   "if (@k) then 1 else 2", "error()", "@k = 1 to 3"});
   }
-
- private:
-  std::mt19937 _random;
 };
 
 TEST(DescendantPredicates, AnswerAsPredicatesThatSeePositionsDo) {

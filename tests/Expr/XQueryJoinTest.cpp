@@ -1,6 +1,7 @@
 // Joins answer what the plain way answers: every query is run in a form that may find its items in
 // a table and in one that may not, over generated data with everything odd that a key or a probe
 // can be.
+#include "Expr/RandomChoices.h"
 #include "Functions/FunctionsTesting.h"
 #include "xquery/xquery.h"
 
@@ -9,7 +10,6 @@
 #include <chrono>
 #include <memory>
 #include <optional>
-#include <random>
 #include <string>
 #include <vector>
 
@@ -18,16 +18,9 @@ namespace {
 
 using functiontest::answer;
 
-class Generator {
+class Generator : public RandomChoices {
  public:
-  explicit Generator(unsigned seed) : _random(seed) {}
-
-  size_t below(size_t bound) {
-    return std::uniform_int_distribution<size_t>(0, bound - 1)(_random);
-  }
-  std::string oneOf(const std::vector<std::string>& choices) {
-    return choices[below(choices.size())];
-  }
+  using RandomChoices::RandomChoices;
 
   // Elements "i" with any number of keys, as attributes and as children.
   std::string document(bool isRegular) {
@@ -99,9 +92,6 @@ class Generator {
                   "$made", "$made", "$tree/i", "$tree//i", "unordered { /r/i }", "$tree/*/c/..",
                   "$many", "$tree/descendant::i", "$all/../i", "$made/descendant::c"});
   }
-
- private:
-  std::mt19937 _random;
 };
 
 Value parsed(const std::string& text) {
