@@ -1,6 +1,6 @@
-#include "Eval/LimitWatch.h"
+#include "Context/LimitWatch.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 
 #include <algorithm>
 

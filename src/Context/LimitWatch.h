@@ -15,7 +15,7 @@
 // over or not, the outer one ends at its next look.
 #pragma once
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/Limits.h"
 #include "xquery/XQuery.h"

@@ -1,6 +1,6 @@
-#include "Eval/StackGuard.h"
+#include "Context/StackGuard.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 

@@ -3,7 +3,7 @@
 // which has no other limit.
 #pragma once
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <cstddef>
 #include <cstdint>

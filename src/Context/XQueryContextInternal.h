@@ -2,8 +2,8 @@
 // error and what is kept from one evaluation to the next.
 #pragma once
 
-#include "Eval/XQueryFrame.h"
-#include "Platform/NSURLLoader.h"
+#include "Context/XQueryFrame.h"
+#include "Platform/Loading/NSURLLoader.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"

@@ -1,7 +1,7 @@
 // The documents and raw bodies of one context.
-#include "Eval/XQueryContextInternal.h"
-#include "Platform/ASCII.h"
-#include "Platform/WorkMeter.h"
+#include "Context/XQueryContextInternal.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/ASCII.h"
 #include "xquery/XMLNode.h"
 
 #include <algorithm>

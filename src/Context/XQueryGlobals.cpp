@@ -4,10 +4,10 @@
 // in the static context of the module that declared it. A module that only another module imports
 // has no place in the main module's list, yet the functions of its importer use its variables: they
 // get their values first of all, a module's own imports before the module.
-#include "Eval/XQueryGlobals.h"
+#include "Context/XQueryGlobals.h"
 
-#include "Eval/StackGuard.h"
-#include "Eval/XQueryContextInternal.h"
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"

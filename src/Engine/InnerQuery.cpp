@@ -1,9 +1,9 @@
-#include "Eval/InnerQuery.h"
+#include "Engine/InnerQuery.h"
 
-#include "Eval/LimitWatch.h"
-#include "Eval/StackGuard.h"
-#include "Eval/XQueryContextInternal.h"
-#include "Platform/WorkMeter.h"
+#include "Context/LimitWatch.h"
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/XMLNode.h"
 

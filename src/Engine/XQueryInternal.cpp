@@ -1,8 +1,8 @@
-#include "Eval/XQueryInternal.h"
+#include "Engine/XQueryInternal.h"
 
 #include "Parser/XQueryParsedModule.h"
 #include "Parser/XQueryParser.h"
-#include "Platform/NSURLLoader.h"
+#include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"

@@ -2,8 +2,8 @@
 // and the cases of a typeswitch.
 #pragma once
 
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
-#include "Expr/XQueryTypeDeclaration.h"
 #include "xquery/String.h"
 
 #include <utility>

@@ -1,6 +1,6 @@
 #include "Expr/XQueryLeaves.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"

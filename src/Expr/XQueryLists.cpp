@@ -1,6 +1,6 @@
 #include "Expr/XQueryLists.h"
 
-#include "Eval/StackGuard.h"
+#include "Context/StackGuard.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQuerySequence.h"
 #include "xquery/Collection.h"

@@ -1,10 +1,10 @@
 #include "Expr/XQueryReads.h"
 
+#include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryCallExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
-#include "Expr/XQueryOperatorExpr.h"
-#include "Expr/XQueryPath.h"
 
 #include <algorithm>
 #include <cstddef>

@@ -1,6 +1,6 @@
 #include "Expr/XQuerySequence.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
 #include <vector>

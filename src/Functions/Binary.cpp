@@ -1,8 +1,8 @@
-#include "Functions/FunctionsBinary.h"
+#include "Functions/Binary.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Platform/TextEncoding.h"
-#include "Platform/WorkMeter.h"
+#include "Context/XQueryContextInternal.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/Encoding.h"
 #include "Types/XQueryBinary.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryDataMatch.h"

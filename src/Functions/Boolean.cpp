@@ -1,4 +1,4 @@
-#include "Functions/FunctionsBoolean.h"
+#include "Functions/Boolean.h"
 
 #include "Types/XQueryAtomization.h"
 #include "xquery/Error.h"

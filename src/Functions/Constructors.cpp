@@ -1,4 +1,4 @@
-#include "Functions/FunctionsConstructors.h"
+#include "Functions/Constructors.h"
 
 #include "Types/XQueryCasting.h"
 

@@ -1,6 +1,6 @@
-#include "Functions/FunctionsContext.h"
+#include "Functions/Context.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
 

@@ -1,6 +1,6 @@
-#include "Functions/FunctionsDate.h"
+#include "Functions/Date.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryDate.h"

@@ -1,13 +1,13 @@
 // Two sequences are deep-equal when they have as many items, not none, and their items are so pair
 // by pair; two empty ones are so too. Nodes are compared by the trees below them, atomic values as
 // "eq" compares them, and a node equals no atomic value. What cannot be compared differs.
-#include "Functions/FunctionsDeepEqual.h"
+#include "Functions/DeepEqual.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Expr/XQueryComparison.h"
-#include "Expr/XQueryOperatorExpr.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Operators/XQueryComparison.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryNodeFunctions.h"
 

@@ -1,4 +1,4 @@
-#include "Functions/FunctionsDuration.h"
+#include "Functions/Duration.h"
 
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryCasting.h"

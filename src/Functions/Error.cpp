@@ -1,4 +1,4 @@
-#include "Functions/FunctionsError.h"
+#include "Functions/Error.h"
 
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryQName.h"

@@ -1,8 +1,8 @@
-#include "Functions/FunctionsExtension.h"
+#include "Functions/Extension.h"
 
-#include "Eval/InnerQuery.h"
-#include "Eval/XQueryContextInternal.h"
-#include "Functions/FunctionsURI.h"
+#include "Context/XQueryContextInternal.h"
+#include "Engine/InnerQuery.h"
+#include "Functions/URI.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryBinary.h"
 #include "Types/XQueryDate.h"

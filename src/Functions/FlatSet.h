@@ -16,7 +16,7 @@
 // A set that it ended in is good for nothing but being destroyed.
 #pragma once
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Object.h"
 
 #include <algorithm>

@@ -1,4 +1,4 @@
-#include "Functions/FunctionsNodeText.h"
+#include "Functions/NodeText.h"
 
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNodeFunctions.h"

@@ -1,4 +1,4 @@
-#include "Functions/FunctionsNumeric.h"
+#include "Functions/Numeric.h"
 
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryCasting.h"

@@ -1,4 +1,4 @@
-#include "Functions/FunctionsQName.h"
+#include "Functions/QName.h"
 
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryCasting.h"

@@ -1,6 +1,6 @@
-#include "Functions/FunctionsRegEx.h"
+#include "Functions/RegEx.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Functions/XQueryRegExCache.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryTypeTable.h"

@@ -1,10 +1,10 @@
-#include "Functions/FunctionsSequence.h"
+#include "Functions/Sequence.h"
 
 #include "Expr/XQuerySequence.h"
-#include "Functions/FunctionsNumeric.h"
+#include "Functions/Numeric.h"
 #include "Functions/XQueryTextArgument.h"
 #include "Functions/XQueryValueSet.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"

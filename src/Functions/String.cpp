@@ -1,8 +1,8 @@
-#include "Functions/FunctionsString.h"
+#include "Functions/String.h"
 
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryTextArgument.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"

@@ -1,12 +1,12 @@
 // 8-bit text, which is plain ASCII, is rewritten in place of widening it: every normalisation form
 // leaves it alone, its case mapping is one unit for one, and it needs no encoding before it is
 // escaped.
-#include "Functions/FunctionsStringMapping.h"
+#include "Functions/StringMapping.h"
 
 #include "Functions/XQueryTextArgument.h"
-#include "Platform/ICUText.h"
-#include "Platform/TextBlocks.h"
-#include "Platform/UTF16.h"
+#include "Platform/Text/Blocks.h"
+#include "Platform/Text/ICUText.h"
+#include "Platform/Text/UTF16.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"

@@ -1,8 +1,8 @@
-#include "Functions/FunctionsSubstring.h"
+#include "Functions/Substring.h"
 
-#include "Expr/XQueryArithmetic.h"
+#include "Expr/Operators/XQueryArithmetic.h"
 #include "Expr/XQuerySequence.h"
-#include "Functions/FunctionsNumeric.h"
+#include "Functions/Numeric.h"
 #include "Functions/XQueryTextArgument.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"

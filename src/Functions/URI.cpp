@@ -1,8 +1,8 @@
-#include "Functions/FunctionsURI.h"
+#include "Functions/URI.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
-#include "Functions/FunctionsContext.h"
+#include "Functions/Context.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryTypeTable.h"

@@ -1,7 +1,7 @@
 #include "Functions/XQueryFunctionCall.h"
 
-#include "Eval/StackGuard.h"
-#include "Eval/XQueryContextInternal.h"
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"

@@ -1,9 +1,9 @@
 #include "Functions/XQueryRegEx.h"
 
 #include "Expr/XQuerySequence.h"
-#include "Platform/UTF16.h"
-#include "Platform/UTF8.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/UTF16.h"
+#include "Platform/Text/UTF8.h"
 #include "xquery/Number.h"
 
 #include <algorithm>

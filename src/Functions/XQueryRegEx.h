@@ -4,7 +4,7 @@
 // failures are silent: the answer is none, which the call that wanted it turns into its error.
 #pragma once
 
-#include "Platform/PCRE.h"
+#include "Platform/Text/PCRE.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 

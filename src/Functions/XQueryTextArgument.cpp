@@ -1,6 +1,6 @@
 #include "Functions/XQueryTextArgument.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Types/XQueryAtomization.h"
 #include "xquery/Collection.h"
 

@@ -1,8 +1,8 @@
-#include "Functions/FunctionsXSLT.h"
+#include "Functions/XSLT.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Functions/FunctionsURI.h"
-#include "Platform/XMLStylesheet.h"
+#include "Context/XQueryContextInternal.h"
+#include "Functions/URI.h"
+#include "Platform/Stylesheets/Stylesheet.h"
 #include "Types/XQueryTypeTable.h"
 
 namespace xquery {

@@ -8,7 +8,7 @@
 // the list it is given and answers that same list.
 #pragma once
 
-#include "Expr/XQueryFLWOR.h"
+#include "Expr/Clauses/XQueryFLWOR.h"
 #include "xquery/Object.h"
 
 #include <cstdint>

@@ -1,5 +1,5 @@
-#include "Expr/XQueryNameTest.h"
-#include "Expr/XQueryPath.h"
+#include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/Paths/XQueryPath.h"
 #include "Parser/BuilderSupport.h"
 #include "Parser/XQueryTokens.h"
 

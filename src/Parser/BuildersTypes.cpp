@@ -1,4 +1,4 @@
-#include "Expr/XQueryTypeDeclaration.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Parser/BuilderSupport.h"
 #include "Parser/XQueryTokens.h"
 

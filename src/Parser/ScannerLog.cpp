@@ -1,6 +1,6 @@
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
-#include "Platform/NSLog.h"
+#include "Platform/Base/NSLog.h"
 #include "xquery/Object.h"
 
 #include <cstdio>

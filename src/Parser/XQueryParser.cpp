@@ -2,8 +2,8 @@
 
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
-#include "Platform/NSLog.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/NSLog.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 
 #include <algorithm>

@@ -5,8 +5,8 @@
 // registry of modules, so the pointer stays good wherever the declaration is used.
 #pragma once
 
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
-#include "Expr/XQueryTypeDeclaration.h"
 #include "Types/XQueryQName.h"
 #include "xquery/String.h"
 

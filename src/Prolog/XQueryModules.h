@@ -6,7 +6,7 @@
 // replaced under its ID is kept as well, for others may have copied its declarations by then.
 #pragma once
 
-#include "Platform/NSURLLoader.h"
+#include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/StringTable.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"

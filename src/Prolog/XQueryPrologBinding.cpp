@@ -1,6 +1,6 @@
 // The declarations of a prolog: their tables, the import of those of library modules, the numbering
 // of local variables, and the binding pass over the declarations.
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"

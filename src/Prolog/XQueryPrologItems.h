@@ -6,8 +6,8 @@
 // prolog. No failure keeps the items after it from being applied.
 #pragma once
 
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
-#include "Expr/XQueryTypeDeclaration.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"

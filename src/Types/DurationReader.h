@@ -1,7 +1,7 @@
 // Reads the lexical forms of durations: letters as written, numbers of digits only.
 #pragma once
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Number.h"
 #include "xquery/String.h"
 

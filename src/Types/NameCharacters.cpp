@@ -2,7 +2,7 @@
 // membership test is one load from read-only memory and needs no first-use guard.
 #include "Types/NameCharacters.h"
 
-#include "Platform/UTF16.h"
+#include "Platform/Text/UTF16.h"
 
 #include <span>
 

@@ -1,7 +1,7 @@
 #include "Types/XQueryAtomization.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Platform/WorkMeter.h"
+#include "Context/XQueryContextInternal.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryNumber.h"

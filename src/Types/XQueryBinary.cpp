@@ -1,6 +1,6 @@
 #include "Types/XQueryBinary.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/NameCharacters.h"
 
 #include <array>

@@ -5,7 +5,7 @@
 // only.
 #include "Types/XQueryCasting.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryBinary.h"
 #include "Types/XQueryDate.h"

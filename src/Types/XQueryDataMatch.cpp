@@ -1,6 +1,6 @@
 #include "Types/XQueryDataMatch.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Collection.h"
 
 #include <cstring>

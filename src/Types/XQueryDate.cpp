@@ -1,6 +1,6 @@
 #include "Types/XQueryDate.h"
 
-#include "Platform/GregorianCalendar.h"
+#include "Platform/Dates/GregorianCalendar.h"
 
 namespace xquery {
 

@@ -1,7 +1,7 @@
 #include "Types/XQueryDateArithmetic.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Platform/GregorianCalendar.h"
+#include "Context/XQueryContextInternal.h"
+#include "Platform/Dates/GregorianCalendar.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryDate.h"
 #include "Types/XQueryErrors.h"

@@ -1,7 +1,7 @@
 // The lexical forms of dates and times. All eight are read by one procedure, which is told the
 // fields that the type has. Numbers are of digits only and nothing is skipped.
-#include "Platform/GregorianCalendar.h"
-#include "Platform/NumberText.h"
+#include "Platform/Dates/GregorianCalendar.h"
+#include "Platform/Numbers/NumberText.h"
 #include "Types/XQueryDate.h"
 #include "xquery/Number.h"
 

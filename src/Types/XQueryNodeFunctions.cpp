@@ -1,7 +1,7 @@
 // Every walk here is a loop: a tree may be a million elements deep.
 #include "Types/XQueryNodeFunctions.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryNumber.h"
 
 #include <unordered_map>

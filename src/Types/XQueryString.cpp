@@ -1,6 +1,6 @@
 #include "Types/XQueryString.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/NameCharacters.h"
 
 namespace xquery {

@@ -1,6 +1,6 @@
 #include "Types/XQueryStringFunctions.h"
 
-#include "Platform/TextBlocks.h"
+#include "Platform/Text/Blocks.h"
 #include "Types/NameCharacters.h"
 
 #include <algorithm>

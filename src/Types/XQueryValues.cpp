@@ -1,6 +1,6 @@
 #include "Types/XQueryValues.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryBinary.h"
 #include "Types/XQueryDate.h"
 #include "Types/XQueryDuration.h"

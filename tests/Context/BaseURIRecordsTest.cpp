@@ -1,5 +1,5 @@
 // The base URIs that constructors record, and the mark they leave on the first result.
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>

@@ -1,8 +1,8 @@
 // Evaluations inside an evaluation: a client of the host begins them on the same thread.
-#include "Eval/LimitsTestSupport.h"
-#include "Eval/LimitWatch.h"
+#include "Context/LimitWatch.h"
+#include "Engine/LimitsTestSupport.h"
 #include "Parser/XQueryParser.h"
-#include "Platform/HTTPServer.h"
+#include "Platform/Loading/HTTPServer.h"
 
 #include <gtest/gtest.h>
 

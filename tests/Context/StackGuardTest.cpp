@@ -1,6 +1,6 @@
-#include "Eval/LimitsTestSupport.h"
-#include "Eval/StackGuard.h"
-#include "Platform/WorkMeter.h"
+#include "Context/StackGuard.h"
+#include "Engine/LimitsTestSupport.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <gtest/gtest.h>
 

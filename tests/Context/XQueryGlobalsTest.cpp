@@ -1,5 +1,5 @@
-#include "Eval/XQueryContextInternal.h"
-#include "Eval/XQueryGlobals.h"
+#include "Context/XQueryContextInternal.h"
+#include "Context/XQueryGlobals.h"
 #include "Prolog/PrologTesting.h"
 
 #include <gtest/gtest.h>

@@ -1,6 +1,6 @@
 // Built-in functions, joins and limits in several threads at once.
-#include "Eval/ConcurrencyTesting.h"
-#include "Platform/LoadingTestSupport.h"
+#include "Engine/ConcurrencyTesting.h"
+#include "Platform/Loading/LoadingTestSupport.h"
 
 #include <gtest/gtest.h>
 

@@ -1,7 +1,7 @@
 // Several threads at once: one query over one document, each thread with a context of its own;
 // compilations; first uses; values handed from thread to thread.
-#include "Eval/ConcurrencyTesting.h"
-#include "Platform/LoadingTestSupport.h"
+#include "Engine/ConcurrencyTesting.h"
+#include "Platform/Loading/LoadingTestSupport.h"
 
 #include <gtest/gtest.h>
 

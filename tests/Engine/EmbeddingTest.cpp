@@ -1,5 +1,5 @@
 // The public interface as a host program uses it: nothing but the installed headers.
-#include "Eval/EmbeddingTesting.h"
+#include "Engine/EmbeddingTesting.h"
 
 #include <atomic>
 #include <string>

@@ -1,4 +1,4 @@
-#include "Eval/InnerQuery.h"
+#include "Engine/InnerQuery.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>

@@ -4,13 +4,13 @@
 // How late an evaluation ends is measured in the processor time of its thread, which a busy machine
 // does not lengthen, except where it waits for others. An evaluation that ends by itself before it
 // is told to fails its test, since it gives no error.
-#include "Eval/LimitsTestSupport.h"
-#include "Eval/XQueryContextInternal.h"
-#include "Platform/HTTPServer.h"
-#include "Platform/LoadingTestSupport.h"
-#include "Platform/StackTestSupport.h"
-#include "Platform/TextTestSupport.h"
-#include "Platform/WorkMeter.h"
+#include "Context/XQueryContextInternal.h"
+#include "Engine/LimitsTestSupport.h"
+#include "Platform/Base/StackTestSupport.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Loading/HTTPServer.h"
+#include "Platform/Loading/LoadingTestSupport.h"
+#include "Platform/Text/TextTestSupport.h"
 
 #include <gtest/gtest.h>
 

@@ -1,8 +1,8 @@
 // Documents and raw bodies of a context, and what a compilation may load.
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/HTTPServer.h"
-#include "Platform/LoadingTestSupport.h"
+#include "Platform/Loading/HTTPServer.h"
+#include "Platform/Loading/LoadingTestSupport.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>

@@ -1,6 +1,6 @@
 // Importing library modules through the public interface.
-#include "Eval/EmbeddingTesting.h"
-#include "Platform/LoadingTestSupport.h"
+#include "Engine/EmbeddingTesting.h"
+#include "Platform/Loading/LoadingTestSupport.h"
 
 #include <string>
 #include <vector>

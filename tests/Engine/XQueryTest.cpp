@@ -1,6 +1,6 @@
 // The compiled query and the evaluation driver, seen through the exported classes.
-#include "Eval/XQueryContextInternal.h"
-#include "Eval/XQueryInternal.h"
+#include "Context/XQueryContextInternal.h"
+#include "Engine/XQueryInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Prolog/XQueryModules.h"

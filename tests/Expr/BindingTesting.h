@@ -1,12 +1,12 @@
 // Shorthands for building expressions that bind variables by hand and for watching what they do.
 #pragma once
 
-#include "Expr/OperatorTestSupport.h"
+#include "Expr/Clauses/XQueryFLWOR.h"
+#include "Expr/Operators/OperatorTestSupport.h"
 #include "Expr/ProbeExpr.h"
-#include "Expr/XQueryFLWOR.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
-#include "Expr/XQueryTypeDeclaration.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"

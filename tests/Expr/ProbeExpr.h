@@ -1,7 +1,7 @@
 // Expressions that do what the test says.
 #pragma once
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryExpr.h"
 #include "xquery/Error.h"
 

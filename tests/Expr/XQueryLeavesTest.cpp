@@ -1,4 +1,4 @@
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Expr/XQuerySequence.h"

@@ -1,6 +1,6 @@
-#include "Expr/XQueryOperatorExpr.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryReads.h"
-#include "PathTesting.h"
+#include "Expr/Paths/PathTesting.h"
 
 namespace xquery {
 namespace {

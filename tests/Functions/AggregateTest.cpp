@@ -1,4 +1,4 @@
-#include "Functions/FunctionsAggregate.h"
+#include "Functions/Aggregate.h"
 #include "Functions/FunctionsTesting.h"
 
 #include <random>

@@ -1,4 +1,4 @@
-#include "Functions/FunctionsBinary.h"
+#include "Functions/Binary.h"
 #include "Functions/FunctionsTesting.h"
 #include "Types/XQueryBinary.h"
 #include "xquery/Data.h"

@@ -1,4 +1,4 @@
-#include "Functions/FunctionsBoolean.h"
+#include "Functions/Boolean.h"
 #include "Functions/FunctionsTesting.h"
 
 namespace xquery {

@@ -1,4 +1,4 @@
-#include "Functions/FunctionsCodepoints.h"
+#include "Functions/Codepoints.h"
 #include "Functions/StringTesting.h"
 #include "xquery/Data.h"
 

@@ -1,4 +1,4 @@
-#include "Functions/FunctionsContext.h"
+#include "Functions/Context.h"
 #include "Functions/FunctionsTesting.h"
 
 namespace xquery {

@@ -1,6 +1,6 @@
-#include "Functions/FunctionsDate.h"
+#include "Functions/Date.h"
 #include "Functions/FunctionsTesting.h"
-#include "Platform/ZoneTestSupport.h"
+#include "Platform/Dates/ZoneTestSupport.h"
 #include "Types/XQueryDate.h"
 
 namespace xquery {

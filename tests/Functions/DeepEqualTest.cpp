@@ -1,4 +1,4 @@
-#include "Functions/FunctionsDeepEqual.h"
+#include "Functions/DeepEqual.h"
 #include "Functions/FunctionsTesting.h"
 #include "xquery/Data.h"
 

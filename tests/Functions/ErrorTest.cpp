@@ -1,4 +1,4 @@
-#include "Functions/FunctionsError.h"
+#include "Functions/Error.h"
 #include "Functions/FunctionsTesting.h"
 #include "Types/XQueryQName.h"
 

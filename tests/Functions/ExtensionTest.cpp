@@ -1,7 +1,7 @@
-#include "Functions/FunctionsExtension.h"
+#include "Functions/Extension.h"
 #include "Functions/FunctionsTesting.h"
-#include "Platform/LoadingTestSupport.h"
-#include "Platform/ProcessorTime.h"
+#include "Platform/Base/ProcessorTime.h"
+#include "Platform/Loading/LoadingTestSupport.h"
 #include "Types/XQueryDate.h"
 
 #include <atomic>

@@ -1,9 +1,9 @@
 // Calling built-in functions, alone and in queries, and reading their answers.
 #pragma once
 
-#include "Expr/OperatorTestSupport.h"
+#include "Expr/Operators/OperatorTestSupport.h"
 #include "Functions/XQueryBuiltInFunction.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <gtest/gtest.h>
 

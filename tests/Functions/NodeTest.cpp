@@ -1,5 +1,5 @@
-#include "Functions/FunctionsNode.h"
 #include "Functions/FunctionsTesting.h"
+#include "Functions/Node.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/Data.h"
 #include "xquery/URL.h"

@@ -1,5 +1,5 @@
-#include "Functions/FunctionsNodeText.h"
 #include "Functions/FunctionsTesting.h"
+#include "Functions/NodeText.h"
 
 namespace xquery {
 namespace {

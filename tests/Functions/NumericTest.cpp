@@ -1,5 +1,5 @@
-#include "Functions/FunctionsNumeric.h"
 #include "Functions/FunctionsTesting.h"
+#include "Functions/Numeric.h"
 
 namespace xquery {
 namespace {

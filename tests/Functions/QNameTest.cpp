@@ -1,5 +1,5 @@
-#include "Functions/FunctionsQName.h"
 #include "Functions/FunctionsTesting.h"
+#include "Functions/QName.h"
 
 namespace xquery {
 namespace {

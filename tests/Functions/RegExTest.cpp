@@ -1,8 +1,8 @@
-#include "Eval/XQueryContextInternal.h"
-#include "Functions/FunctionsRegEx.h"
+#include "Context/XQueryContextInternal.h"
 #include "Functions/FunctionsTesting.h"
+#include "Functions/RegEx.h"
 #include "Functions/XQueryRegExCache.h"
-#include "Platform/ProcessorTime.h"
+#include "Platform/Base/ProcessorTime.h"
 
 #include <gtest/gtest.h>
 

@@ -1,5 +1,5 @@
-#include "Functions/FunctionsSequence.h"
 #include "Functions/FunctionsTesting.h"
+#include "Functions/Sequence.h"
 
 namespace xquery {
 namespace {

@@ -1,4 +1,4 @@
-#include "Functions/FunctionsStringMapping.h"
+#include "Functions/StringMapping.h"
 #include "Functions/StringTesting.h"
 
 #include <clocale>

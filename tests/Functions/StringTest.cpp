@@ -1,4 +1,4 @@
-#include "Functions/FunctionsString.h"
+#include "Functions/String.h"
 #include "Functions/StringTesting.h"
 
 namespace xquery {

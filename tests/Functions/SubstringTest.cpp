@@ -1,6 +1,6 @@
-#include "Functions/FunctionsSubstring.h"
 #include "Functions/StringTesting.h"
-#include "Platform/ProcessorTime.h"
+#include "Functions/Substring.h"
+#include "Platform/Base/ProcessorTime.h"
 #include "Types/XQueryAtomization.h"
 
 #include <algorithm>

@@ -1,7 +1,7 @@
 #include "Functions/FunctionsTesting.h"
-#include "Functions/FunctionsURI.h"
-#include "Platform/HTTPServer.h"
-#include "Platform/LoadingTestSupport.h"
+#include "Functions/URI.h"
+#include "Platform/Loading/HTTPServer.h"
+#include "Platform/Loading/LoadingTestSupport.h"
 #include "xquery/URL.h"
 
 namespace xquery {

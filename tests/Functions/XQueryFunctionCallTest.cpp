@@ -1,11 +1,11 @@
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
-#include "Functions/FunctionsBoolean.h"
-#include "Functions/FunctionsSequence.h"
-#include "Functions/FunctionsString.h"
+#include "Functions/Boolean.h"
 #include "Functions/FunctionsTesting.h"
+#include "Functions/Sequence.h"
+#include "Functions/String.h"
 #include "Functions/XQueryFunctionCall.h"
-#include "Platform/StackTestSupport.h"
+#include "Platform/Base/StackTestSupport.h"
 #include "Prolog/PrologTesting.h"
 
 #include <algorithm>

@@ -1,6 +1,6 @@
 #include "Functions/FunctionsTesting.h"
 #include "Functions/XQueryValueSet.h"
-#include "Platform/ProcessorTime.h"
+#include "Platform/Base/ProcessorTime.h"
 #include "Types/XQueryDate.h"
 
 #include <cstdlib>

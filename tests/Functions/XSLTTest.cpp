@@ -1,7 +1,7 @@
 #include "Functions/FunctionsTesting.h"
-#include "Functions/FunctionsXSLT.h"
-#include "Platform/LoadingTestSupport.h"
-#include "Platform/StylesheetTestSupport.h"
+#include "Functions/XSLT.h"
+#include "Platform/Loading/LoadingTestSupport.h"
+#include "Platform/Stylesheets/StylesheetTestSupport.h"
 
 #include <chrono>
 

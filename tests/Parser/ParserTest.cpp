@@ -2,8 +2,8 @@
 #include "Parser/XQueryParser.h"
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
-#include "Platform/ProcessorTime.h"
-#include "Platform/TextTestSupport.h"
+#include "Platform/Base/ProcessorTime.h"
+#include "Platform/Text/TextTestSupport.h"
 
 #include <gtest/gtest.h>
 

@@ -1,7 +1,7 @@
 // What the tests of this folder share.
 #pragma once
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"
 #include "Types/XQueryValues.h"

@@ -1,5 +1,5 @@
-#include "Platform/GregorianCalendar.h"
-#include "Platform/ZoneTestSupport.h"
+#include "Platform/Dates/GregorianCalendar.h"
+#include "Platform/Dates/ZoneTestSupport.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryDate.h"
 #include "Types/XQueryDateArithmetic.h"

@@ -1,4 +1,4 @@
-#include "Platform/ZoneTestSupport.h"
+#include "Platform/Dates/ZoneTestSupport.h"
 #include "Types/XQueryDate.h"
 #include "TypesTestSupport.h"
 

@@ -1,5 +1,5 @@
-#include "Platform/ProcessorTime.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/ProcessorTime.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "TypesTestSupport.h"
 

@@ -1,5 +1,5 @@
-#include "Platform/WorkMeter.h"
-#include "Platform/ZoneTestSupport.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Dates/ZoneTestSupport.h"
 #include "Types/XQueryNumber.h"
 
 #include <gtest/gtest.h>

@@ -1,6 +1,6 @@
 #include "arguments/Samples.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryQName.h"

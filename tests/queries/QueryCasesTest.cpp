@@ -15,7 +15,7 @@
 //   element()	<b/>
 //   -- error 6 line 1 invalid type for operator     (instead of a result; "line N" is optional,
 //                                                    "..." stands for any text)
-#include "Platform/LoadingTestSupport.h"
+#include "Platform/Loading/LoadingTestSupport.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>

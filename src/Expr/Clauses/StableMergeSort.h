@@ -3,7 +3,7 @@
 // array is ever touched. The standard library promises that only for consistent relations.
 #pragma once
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
 #include <utility>

@@ -1,8 +1,8 @@
-#include "Expr/XQueryClauseItems.h"
+#include "Expr/Clauses/XQueryClauseItems.h"
 
+#include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/Operators/XQueryRange.h"
 #include "Expr/XQueryBinding.h"
-#include "Expr/XQueryOperatorExpr.h"
-#include "Expr/XQueryRange.h"
 #include "Types/XQueryNumber.h"
 
 namespace xquery {

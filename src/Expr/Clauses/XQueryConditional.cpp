@@ -1,7 +1,7 @@
-#include "Expr/XQueryConditional.h"
+#include "Expr/Clauses/XQueryConditional.h"
 
-#include "Eval/StackGuard.h"
-#include "Eval/XQueryContextInternal.h"
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryBinding.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"

@@ -1,9 +1,9 @@
 // The FLWOR expression and the expressions that switch the ordering mode.
 #pragma once
 
+#include "Expr/Clauses/XQueryJoin.h"
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQueryExpr.h"
-#include "Expr/XQueryJoin.h"
 #include "Expr/XQuerySequence.h"
 
 #include <memory>

@@ -18,10 +18,10 @@
 // leaves a tie with a key that is not empty, the plain comparison decides. For a descending order
 // the ranks are complemented. So every single comparison has the plain one's answer, and both sorts
 // are the same algorithm.
-#include "Expr/XQueryFLWORSort.h"
+#include "Expr/Clauses/XQueryFLWORSort.h"
 
-#include "Expr/StableMergeSort.h"
-#include "Platform/WorkMeter.h"
+#include "Expr/Clauses/StableMergeSort.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Number.h"
 #include "xquery/String.h"

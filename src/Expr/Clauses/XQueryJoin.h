@@ -11,8 +11,8 @@
 // diagnostics on, when evaluating writes to the log, there are no joins.
 #pragma once
 
-#include "Expr/XQueryJoinCondition.h"
-#include "Expr/XQueryJoinTable.h"
+#include "Expr/Clauses/XQueryJoinCondition.h"
+#include "Expr/Clauses/XQueryJoinTable.h"
 #include "Expr/XQueryReads.h"
 
 #include <memory>

@@ -1,7 +1,7 @@
-#include "Expr/XQueryJoinCondition.h"
+#include "Expr/Clauses/XQueryJoinCondition.h"
 
+#include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLists.h"
-#include "Expr/XQueryOperatorExpr.h"
 
 #include <algorithm>
 #include <cstddef>

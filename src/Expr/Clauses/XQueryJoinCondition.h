@@ -2,7 +2,7 @@
 // from the item, the other one, the probe, is the same for all items of one round.
 #pragma once
 
-#include "Expr/XQueryComparison.h"
+#include "Expr/Operators/XQueryComparison.h"
 #include "Expr/XQueryExpr.h"
 #include "Expr/XQueryReads.h"
 

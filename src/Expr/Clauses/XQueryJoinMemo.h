@@ -7,7 +7,7 @@
 // a few disappointments in a row the memo looks only now and then.
 #pragma once
 
-#include "Expr/XQueryJoinTable.h"
+#include "Expr/Clauses/XQueryJoinTable.h"
 #include "xquery/Object.h"
 
 #include <cstdint>

@@ -1,7 +1,7 @@
-#include "Expr/XQueryJoinTable.h"
+#include "Expr/Clauses/XQueryJoinTable.h"
 
 #include "Expr/XQuerySequence.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Number.h"

@@ -13,8 +13,8 @@
 // items too and leaves it to the caller to ask for each.
 #pragma once
 
-#include "Expr/XQueryJoinCondition.h"
-#include "Expr/XQueryUntypedText.h"
+#include "Expr/Clauses/XQueryJoinCondition.h"
+#include "Expr/Operators/XQueryUntypedText.h"
 #include "xquery/Object.h"
 
 #include <cstddef>

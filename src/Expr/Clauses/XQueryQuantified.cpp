@@ -1,8 +1,8 @@
-#include "Expr/XQueryQuantified.h"
+#include "Expr/Clauses/XQueryQuantified.h"
 
-#include "Eval/StackGuard.h"
-#include "Eval/XQueryContextInternal.h"
-#include "Expr/XQueryClauseItems.h"
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Clauses/XQueryClauseItems.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 

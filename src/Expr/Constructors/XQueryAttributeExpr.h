@@ -1,7 +1,7 @@
 // Attribute constructors.
 #pragma once
 
-#include "Expr/XQueryConstructorName.h"
+#include "Expr/Constructors/XQueryConstructorName.h"
 #include "Expr/XQueryExpr.h"
 #include "xquery/XMLNode.h"
 

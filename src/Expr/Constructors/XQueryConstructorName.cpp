@@ -1,6 +1,6 @@
-#include "Expr/XQueryConstructorName.h"
+#include "Expr/Constructors/XQueryConstructorName.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/NameCharacters.h"

@@ -3,7 +3,7 @@
 #pragma once
 
 #include "Expr/XQueryExpr.h"
-#include "Platform/XMLNames.h"
+#include "Platform/Tree/Names.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"

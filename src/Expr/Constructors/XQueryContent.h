@@ -5,8 +5,8 @@
 // parent become children as they are, and nodes that have one are copied.
 #pragma once
 
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTree.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"

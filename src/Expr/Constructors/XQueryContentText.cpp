@@ -1,7 +1,7 @@
-#include "Expr/XQueryContentText.h"
+#include "Expr/Constructors/XQueryContentText.h"
 
 #include "Expr/XQuerySequence.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "xquery/XMLNode.h"

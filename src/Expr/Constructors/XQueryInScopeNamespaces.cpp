@@ -1,9 +1,9 @@
-#include "Expr/XQueryInScopeNamespaces.h"
+#include "Expr/Constructors/XQueryInScopeNamespaces.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Platform/WorkMeter.h"
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTree.h"
+#include "Context/XQueryContextInternal.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 #include "Types/XQueryNodeFunctions.h"
 
 #include <algorithm>

@@ -1,7 +1,7 @@
 // Constructors of texts, comments, processing instructions, documents and namespaces.
 #pragma once
 
-#include "Expr/XQueryConstructorName.h"
+#include "Expr/Constructors/XQueryConstructorName.h"
 #include "Expr/XQueryExpr.h"
 #include "xquery/XMLNode.h"
 

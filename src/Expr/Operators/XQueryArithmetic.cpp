@@ -1,6 +1,6 @@
-#include "Expr/XQueryArithmetic.h"
+#include "Expr/Operators/XQueryArithmetic.h"
 
-#include "Expr/XQueryOperatorExpr.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"

@@ -12,9 +12,9 @@
 //                      the other one of these or exactly xs:integer or xs:decimal. The common type
 //                      is xs:double; an untyped operand is cast by scanning its text, and an exact
 //                      one by scanning what it prints.
-#include "Expr/XQueryArithmetic.h"
-#include "Expr/XQueryNumericOperand.h"
-#include "Expr/XQueryOperatorExpr.h"
+#include "Expr/Operators/XQueryArithmetic.h"
+#include "Expr/Operators/XQueryNumericOperand.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Types/XQueryNumber.h"
 
 #include <cmath>

@@ -13,12 +13,12 @@
 // When no pair can fail and there are many, not every pair has to be looked at: an order relation
 // is decided by the extremes of both sides, equality by a binary search. A range of integers is not
 // even made for that: an item is compared with its bounds.
-#include "Expr/XQueryArithmetic.h"
-#include "Expr/XQueryComparison.h"
-#include "Expr/XQueryOperatorExpr.h"
+#include "Expr/Operators/XQueryArithmetic.h"
+#include "Expr/Operators/XQueryComparison.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/Operators/XQueryUntypedText.h"
 #include "Expr/XQuerySequence.h"
-#include "Expr/XQueryUntypedText.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"

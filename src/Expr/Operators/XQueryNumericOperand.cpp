@@ -1,4 +1,4 @@
-#include "Expr/XQueryNumericOperand.h"
+#include "Expr/Operators/XQueryNumericOperand.h"
 
 namespace xquery {
 

@@ -1,9 +1,9 @@
-#include "Expr/XQueryRange.h"
+#include "Expr/Operators/XQueryRange.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Expr/XQueryOperatorExpr.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"

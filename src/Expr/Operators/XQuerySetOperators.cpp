@@ -1,9 +1,9 @@
 // The set operators over nodes: union, intersect, except.
-#include "Expr/IdentitySet.h"
-#include "Expr/NodeOrder.h"
-#include "Expr/XQueryOperatorExpr.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/Paths/IdentitySet.h"
+#include "Expr/Paths/NodeOrder.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Collection.h"
 
 #include <vector>

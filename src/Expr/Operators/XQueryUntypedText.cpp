@@ -1,6 +1,6 @@
-#include "Expr/XQueryUntypedText.h"
+#include "Expr/Operators/XQueryUntypedText.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/XMLNode.h"
 
 namespace xquery {

@@ -1,7 +1,7 @@
 // A set of objects by identity: open addressing over pointers, nothing retained.
 #pragma once
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Object.h"
 
 #include <cstdint>

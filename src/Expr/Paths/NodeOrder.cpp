@@ -12,10 +12,10 @@
 // cannot be compared in the order in which it stands, whatever the comparator answers. They look up
 // the tree and the number of each node once; climbing per comparison would multiply the depth of
 // the trees into the sort.
-#include "Expr/NodeOrder.h"
+#include "Expr/Paths/NodeOrder.h"
 
-#include "Expr/StableMergeSort.h"
-#include "Platform/WorkMeter.h"
+#include "Expr/Clauses/StableMergeSort.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Number.h"
 
 #include <algorithm>

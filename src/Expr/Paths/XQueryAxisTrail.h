@@ -27,8 +27,8 @@
 // A trail holds nodes without keeping their trees alive, and is used with one axis.
 #pragma once
 
-#include "Expr/IdentitySet.h"
-#include "Expr/XQueryAxisWalk.h"
+#include "Expr/Paths/IdentitySet.h"
+#include "Expr/Paths/XQueryAxisWalk.h"
 #include "xquery/XMLNode.h"
 
 #include <memory>

@@ -1,4 +1,4 @@
-#include "Expr/XQueryAxisWalk.h"
+#include "Expr/Paths/XQueryAxisWalk.h"
 
 namespace xquery {
 

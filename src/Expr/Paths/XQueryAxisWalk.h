@@ -9,8 +9,8 @@
 // changes it refers to.
 #pragma once
 
-#include "Expr/XQueryPath.h"
-#include "Platform/WorkMeter.h"
+#include "Expr/Paths/XQueryPath.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/XMLNode.h"
 
 #include <vector>

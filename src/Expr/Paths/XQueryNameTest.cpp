@@ -4,9 +4,9 @@
 // element name without a prefix in a main module without a default element namespace is not known
 // before run time, since the context may have a default namespace; it usually has none, so the name
 // it then stands for is interned at binding as well.
-#include "Expr/XQueryNameTest.h"
+#include "Expr/Paths/XQueryNameTest.h"
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"

@@ -18,15 +18,15 @@
 // node twice. The order differs (the two steps go parent by parent), so the child step takes the
 // descendant axis of the node only when no predicate can tell, both are repeatable with all steps
 // after them, and the path's results will be sorted.
-#include "Expr/XQueryPath.h"
+#include "Expr/Paths/XQueryPath.h"
 
-#include "Eval/StackGuard.h"
-#include "Eval/XQueryContextInternal.h"
-#include "Expr/XQueryAxisWalk.h"
-#include "Expr/XQueryPathRun.h"
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Paths/XQueryAxisWalk.h"
+#include "Expr/Paths/XQueryPathRun.h"
 #include "Expr/XQueryReads.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 

@@ -6,9 +6,9 @@
 // tree is kept alive by the item the path started from.
 #pragma once
 
+#include "Expr/Clauses/XQueryJoin.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
-#include "Expr/XQueryJoin.h"
-#include "Expr/XQueryTypeDeclaration.h"
 #include "xquery/XMLNode.h"
 
 #include <memory>

@@ -1,9 +1,9 @@
-#include "Expr/XQueryPathResults.h"
+#include "Expr/Paths/XQueryPathResults.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Expr/NodeOrder.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Paths/NodeOrder.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryTypeTable.h"
 

@@ -7,7 +7,7 @@
 // last is a duplicate without breaking it.
 #pragma once
 
-#include "Expr/IdentitySet.h"
+#include "Expr/Paths/IdentitySet.h"
 #include "xquery/Collection.h"
 #include "xquery/Object.h"
 #include "xquery/XMLNode.h"

@@ -1,8 +1,8 @@
-#include "Expr/XQueryPathRun.h"
+#include "Expr/Paths/XQueryPathRun.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Expr/XQueryPath.h"
-#include "Platform/XMLTree.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Paths/XQueryPath.h"
+#include "Platform/Tree/Arena.h"
 
 namespace xquery {
 namespace {

@@ -2,10 +2,10 @@
 // its nodes.
 #pragma once
 
-#include "Expr/XQueryAxisTrail.h"
-#include "Expr/XQueryNameTest.h"
-#include "Expr/XQueryPathResults.h"
-#include "Expr/XQueryTypeDeclaration.h"
+#include "Expr/Paths/XQueryAxisTrail.h"
+#include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/Paths/XQueryPathResults.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "xquery/XMLNode.h"
 
 #include <cstdint>

@@ -4,15 +4,15 @@
 // once per item with the item as focus; a number selects by position, anything else by its truth.
 // An error in a predicate drops the item it arose for and nothing more: a path over irregular data
 // keeps what fits. Reaching an engine limit is no such error and ends the evaluation.
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryCallExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
-#include "Expr/XQueryOperatorExpr.h"
-#include "Expr/XQueryPath.h"
 #include "Expr/XQueryReads.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"

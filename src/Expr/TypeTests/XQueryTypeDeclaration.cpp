@@ -1,8 +1,8 @@
-#include "Expr/XQueryTypeDeclaration.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 
-#include "Eval/XQueryContextInternal.h"
-#include "Expr/XQueryNameTest.h"
-#include "Platform/WorkMeter.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Paths/XQueryNameTest.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryQName.h"

@@ -1,7 +1,7 @@
-#include "Expr/XQueryTypeExprs.h"
+#include "Expr/TypeTests/XQueryTypeExprs.h"
 
-#include "Eval/StackGuard.h"
-#include "Eval/XQueryContextInternal.h"
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryErrors.h"

@@ -1,8 +1,8 @@
 // instance of, treat as, cast as, castable as.
 #pragma once
 
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
-#include "Expr/XQueryTypeDeclaration.h"
 #include "Types/XQueryCasting.h"
 
 #include <utility>

@@ -1,7 +1,7 @@
-#include "Expr/XQueryTypeswitch.h"
+#include "Expr/TypeTests/XQueryTypeswitch.h"
 
-#include "Eval/StackGuard.h"
-#include "Eval/XQueryContextInternal.h"
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
 #include "Types/XQueryErrors.h"
 
 namespace xquery {

@@ -1,4 +1,4 @@
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Data.h"
 
 namespace xquery {

@@ -1,4 +1,4 @@
-#include "Platform/NSLog.h"
+#include "Platform/Base/NSLog.h"
 #include "xquery/Error.h"
 
 #include <string>

@@ -12,7 +12,7 @@
 // Under a sanitizer every block comes from malloc, so that it sees each of them.
 #include "xquery/Object.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
 #include <cstdlib>

@@ -1,6 +1,6 @@
-#include "Platform/ICUTimeZone.h"
+#include "Platform/Dates/ICUTimeZone.h"
 
-#include "Platform/GregorianCalendar.h"
+#include "Platform/Dates/GregorianCalendar.h"
 
 #include <unicode/basictz.h>
 #include <unicode/simpletz.h>

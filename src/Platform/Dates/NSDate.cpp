@@ -1,5 +1,5 @@
 // Instants and the calendar.
-#include "Platform/GregorianCalendar.h"
+#include "Platform/Dates/GregorianCalendar.h"
 #include "xquery/Date.h"
 
 #include <chrono>

@@ -1,4 +1,4 @@
-#include "Platform/ICUTimeZone.h"
+#include "Platform/Dates/ICUTimeZone.h"
 #include "xquery/Date.h"
 
 namespace xquery {

@@ -1,6 +1,6 @@
-#include "Platform/Curl.h"
+#include "Platform/Loading/Curl.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <curl/curl.h>
 

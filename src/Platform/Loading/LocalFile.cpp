@@ -1,6 +1,6 @@
-#include "Platform/LocalFile.h"
+#include "Platform/Loading/LocalFile.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <cerrno>
 #include <climits>

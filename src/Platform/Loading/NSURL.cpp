@@ -1,5 +1,5 @@
-#include "Platform/ASCII.h"
-#include "Platform/URIParser.h"
+#include "Platform/Loading/URIParser.h"
+#include "Platform/Text/ASCII.h"
 #include "xquery/URL.h"
 
 #include <string_view>

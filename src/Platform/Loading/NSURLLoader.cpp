@@ -1,8 +1,8 @@
-#include "Platform/NSURLLoader.h"
+#include "Platform/Loading/NSURLLoader.h"
 
-#include "Platform/Curl.h"
-#include "Platform/LocalFile.h"
-#include "Platform/NSLog.h"
+#include "Platform/Base/NSLog.h"
+#include "Platform/Loading/Curl.h"
+#include "Platform/Loading/LocalFile.h"
 
 #include <algorithm>
 

@@ -2,7 +2,7 @@
 // fetched.
 #pragma once
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Data.h"
 #include "xquery/Loading.h"
 #include "xquery/Object.h"

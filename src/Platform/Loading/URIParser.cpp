@@ -1,4 +1,4 @@
-#include "Platform/URIParser.h"
+#include "Platform/Loading/URIParser.h"
 
 #include <uriparser/Uri.h>
 

@@ -1,4 +1,4 @@
-#include "Platform/BigInteger.h"
+#include "Platform/Numbers/BigInteger.h"
 
 namespace xquery {
 

@@ -1,4 +1,4 @@
-#include "Platform/NumberText.h"
+#include "Platform/Numbers/NumberText.h"
 #include "xquery/Number.h"
 
 #include <charconv>

@@ -1,6 +1,6 @@
 // Scanning and printing of numbers. Digits are the C++ library's shortest round-trip ones; nothing
 // here depends on the locale of the process.
-#include "Platform/NumberText.h"
+#include "Platform/Numbers/NumberText.h"
 
 #include "xquery/Number.h"
 

@@ -1,7 +1,7 @@
-#include "Platform/HTMLText.h"
+#include "Platform/Reading/HTMLText.h"
 
-#include "Platform/ASCII.h"
-#include "Platform/TextEncoding.h"
+#include "Platform/Text/ASCII.h"
+#include "Platform/Text/Encoding.h"
 #include "xquery/String.h"
 
 namespace xquery {

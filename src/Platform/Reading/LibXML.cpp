@@ -1,6 +1,6 @@
-#include "Platform/LibXML.h"
+#include "Platform/Reading/LibXML.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <libxml/parser.h>
 #include <libxml/parserInternals.h>

@@ -10,13 +10,13 @@
 //
 // What it makes of the HTML is not written by libtidy but here: as XML that is always well formed,
 // and without the line breaks that a pretty printer adds.
-#include "Platform/Tidy.h"
+#include "Platform/Reading/Tidy.h"
 
-#include "Platform/HTMLText.h"
-#include "Platform/ThreadClock.h"
-#include "Platform/UTF8.h"
-#include "Platform/WorkerThread.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/ThreadClock.h"
+#include "Platform/Base/WorkerThread.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/HTMLText.h"
+#include "Platform/Text/UTF8.h"
 
 #include <algorithm>
 #include <atomic>

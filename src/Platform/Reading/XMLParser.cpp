@@ -4,11 +4,11 @@
 // 8-bit if it can be, and becomes a text node unless it is white space that is not to be kept.
 // Names are looked up by the addresses of libxml2's texts, which are equal for equal names within
 // one document, so that the process's table of names is asked once per name and document.
-#include "Platform/LibXML.h"
-#include "Platform/Tidy.h"
-#include "Platform/UTF8.h"
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTreeBuilder.h"
+#include "Platform/Reading/LibXML.h"
+#include "Platform/Reading/Tidy.h"
+#include "Platform/Text/UTF8.h"
+#include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeBuilder.h"
 #include "xquery/XMLNode.h"
 
 #include <algorithm>

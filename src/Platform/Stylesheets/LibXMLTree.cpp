@@ -1,9 +1,9 @@
-#include "Platform/LibXMLTree.h"
+#include "Platform/Stylesheets/LibXMLTree.h"
 
-#include "Platform/UTF8.h"
-#include "Platform/WorkMeter.h"
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTreeBuilder.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/UTF8.h"
+#include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeBuilder.h"
 
 #include <libxml/parser.h>
 #include <libxml/tree.h>

@@ -1,8 +1,8 @@
-#include "Platform/LibXSLT.h"
+#include "Platform/Stylesheets/LibXSLT.h"
 
-#include "Platform/LibXMLTree.h"
-#include "Platform/WorkerThread.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkerThread.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Stylesheets/LibXMLTree.h"
 
 #include <libxml/globals.h>
 #include <libxml/parser.h>

@@ -1,6 +1,6 @@
-#include "Platform/XMLStylesheet.h"
+#include "Platform/Stylesheets/Stylesheet.h"
 
-#include "Platform/LibXSLT.h"
+#include "Platform/Stylesheets/LibXSLT.h"
 #include "xquery/Error.h"
 #include "xquery/Loading.h"
 

@@ -1,7 +1,7 @@
 // Stylesheets applied to a document with a loader that is there already.
 #pragma once
 
-#include "Platform/NSURLLoader.h"
+#include "Platform/Loading/NSURLLoader.h"
 #include "xquery/XMLNode.h"
 
 #include <string>

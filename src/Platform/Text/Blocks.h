@@ -1,7 +1,7 @@
 // A long text in pieces that are one step of work each, so that going through it can be ended.
 #pragma once
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/String.h"
 
 #include <cstdint>

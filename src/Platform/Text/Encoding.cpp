@@ -1,6 +1,6 @@
-#include "Platform/TextEncoding.h"
+#include "Platform/Text/Encoding.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <unicode/ucnv.h>
 #include <unicode/ucnv_err.h>

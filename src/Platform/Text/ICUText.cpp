@@ -1,6 +1,6 @@
-#include "Platform/ICUText.h"
+#include "Platform/Text/ICUText.h"
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <unicode/uchar.h>
 #include <unicode/unorm2.h>

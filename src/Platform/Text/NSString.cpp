@@ -5,8 +5,8 @@
 //   InTree   in the arena of a tree, which `owner` keeps alive
 //   Shared   in the buffer of another string, which `owner` keeps alive
 //   none     in a buffer of its own
-#include "Platform/UTF16.h"
-#include "Platform/UTF8.h"
+#include "Platform/Text/UTF16.h"
+#include "Platform/Text/UTF8.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
 

@@ -2,8 +2,8 @@
 //
 // Both representations give the same answers. 8-bit text against 8-bit text, the common case, goes
 // through the C library's byte functions; the other pairings share one implementation per question.
-#include "Platform/TextBlocks.h"
-#include "Platform/UTF16.h"
+#include "Platform/Text/Blocks.h"
+#include "Platform/Text/UTF16.h"
 #include "xquery/String.h"
 
 #include <algorithm>

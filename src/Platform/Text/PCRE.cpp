@@ -7,12 +7,12 @@
 // sees; there the time of the processor is watched besides. The same place is where the engine's
 // deadline and cancellation are looked at.
 #define PCRE2_CODE_UNIT_WIDTH 8
-#include "Platform/PCRE.h"
+#include "Platform/Text/PCRE.h"
 
-#include "Platform/PCREClassicSyntax.h"
-#include "Platform/ThreadClock.h"
-#include "Platform/UTF8.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/ThreadClock.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/PCREClassicSyntax.h"
+#include "Platform/Text/UTF8.h"
 
 #include <pcre2.h>
 

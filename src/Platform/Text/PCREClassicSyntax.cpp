@@ -8,7 +8,7 @@
 // Escapes that have a meaning and are malformed ("\p{Nothing}", "\x{110000}", "\c" at the end) are
 // errors in both. That is why the successor's own option to read bad escapes literally is not used:
 // it would accept these too.
-#include "Platform/PCREClassicSyntax.h"
+#include "Platform/Text/PCREClassicSyntax.h"
 
 #include <cstddef>
 

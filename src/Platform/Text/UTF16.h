@@ -2,7 +2,7 @@
 // hold surrogates that are lone, which have no form in UTF-8 or UTF-32.
 #pragma once
 
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/String.h"
 
 #include <algorithm>

@@ -1,9 +1,9 @@
-#include "Platform/XMLTree.h"
+#include "Platform/Tree/Arena.h"
 
-#include "Platform/UTF16.h"
-#include "Platform/WorkMeter.h"
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTreeExtra.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/UTF16.h"
+#include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeExtra.h"
 
 #include <algorithm>
 #include <cstdlib>

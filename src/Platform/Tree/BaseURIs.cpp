@@ -3,7 +3,7 @@
 //
 // Reading does not change the ring, only the place where the next search starts, so that several
 // threads may ask.
-#include "Platform/XMLTree.h"
+#include "Platform/Tree/Arena.h"
 
 #include <new>
 #include <utility>

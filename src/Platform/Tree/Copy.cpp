@@ -1,8 +1,8 @@
 // Deep copies. The copy is a tree of its own, numbered as it is built; its elements keep their own
 // namespace declarations and every name its URI, so nothing is looked up above the original.
-#include "Platform/WorkMeter.h"
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTreeBuilder.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeBuilder.h"
 #include "xquery/XMLNode.h"
 
 #include <cstring>

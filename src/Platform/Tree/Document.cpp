@@ -1,4 +1,4 @@
-#include "Platform/XMLTree.h"
+#include "Platform/Tree/Arena.h"
 #include "xquery/XMLNode.h"
 
 namespace xquery {

@@ -1,6 +1,6 @@
-#include "Platform/WorkMeter.h"
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTree.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 #include "xquery/XMLNode.h"
 
 namespace xquery {

@@ -4,7 +4,7 @@
 // name holds its expanded name, which holds its URI. The last count is given up under the lock of
 // the shard, so that a name found there under the lock is alive; counts above one change without
 // it. Hashes start from a random seed: whoever writes a document cannot choose names that collide.
-#include "Platform/XMLNames.h"
+#include "Platform/Tree/Names.h"
 
 #include <algorithm>
 #include <array>

@@ -1,10 +1,9 @@
 // What every kind of node can do; see XMLElement.cpp and XMLDocument.cpp for the two that have
 // children.
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 #include "xquery/XMLNode.h"
-
-#include "Platform/WorkMeter.h"
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTree.h"
 
 namespace xquery {
 

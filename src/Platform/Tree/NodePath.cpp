@@ -1,5 +1,5 @@
 // The path that leads to a node.
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/XMLNode.h"
 
 #include <string>

@@ -12,9 +12,9 @@
 // What XML cannot contain (control characters, lone surrogates) is written as U+FFFD, and comments
 // and processing instructions that would end early are written with a space in between, so that
 // the output is always well formed.
-#include "Platform/WorkMeter.h"
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTree.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 #include "xquery/XMLNode.h"
 
 #include <array>

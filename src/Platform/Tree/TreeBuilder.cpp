@@ -1,4 +1,4 @@
-#include "Platform/XMLTreeBuilder.h"
+#include "Platform/Tree/TreeBuilder.h"
 
 #include <new>
 

@@ -2,7 +2,7 @@
 // arrive. Parsing and copying are its users.
 #pragma once
 
-#include "Platform/XMLTree.h"
+#include "Platform/Tree/Arena.h"
 
 namespace xquery {
 

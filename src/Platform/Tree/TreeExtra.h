@@ -4,8 +4,8 @@
 // is kept in the tree itself, a few in a block of the object allocator, and more in the extra part.
 #pragma once
 
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTree.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 
 #include <cstddef>
 #include <cstdint>

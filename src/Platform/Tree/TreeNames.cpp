@@ -1,4 +1,4 @@
-#include "Platform/XMLTreeExtra.h"
+#include "Platform/Tree/TreeExtra.h"
 
 #include <algorithm>
 #include <memory>

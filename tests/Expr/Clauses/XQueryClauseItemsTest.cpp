@@ -1,5 +1,5 @@
 #include "Expr/BindingTesting.h"
-#include "Expr/XQueryClauseItems.h"
+#include "Expr/Clauses/XQueryClauseItems.h"
 
 #include <gtest/gtest.h>
 

@@ -1,5 +1,5 @@
 #include "Expr/BindingTesting.h"
-#include "Expr/XQueryConditional.h"
+#include "Expr/Clauses/XQueryConditional.h"
 
 #include <gtest/gtest.h>
 

@@ -1,5 +1,5 @@
 #include "Expr/BindingTesting.h"
-#include "Expr/XQueryFLWORSort.h"
+#include "Expr/Clauses/XQueryFLWORSort.h"
 
 #include <gtest/gtest.h>
 

@@ -1,6 +1,6 @@
 #include "Expr/BindingTesting.h"
-#include "Expr/XQueryFLWOR.h"
-#include "Platform/StackTestSupport.h"
+#include "Expr/Clauses/XQueryFLWOR.h"
+#include "Platform/Base/StackTestSupport.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "Expr/XQueryJoinMemo.h"
+#include "Expr/Clauses/XQueryJoinMemo.h"
 #include "Expr/XQueryLeaves.h"
 #include "Functions/FunctionsTesting.h"
 

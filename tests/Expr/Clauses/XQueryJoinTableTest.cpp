@@ -1,4 +1,4 @@
-#include "Expr/XQueryJoinTable.h"
+#include "Expr/Clauses/XQueryJoinTable.h"
 #include "Functions/FunctionsTesting.h"
 
 #include <gtest/gtest.h>

@@ -1,5 +1,5 @@
 #include "Expr/BindingTesting.h"
-#include "Expr/XQueryQuantified.h"
+#include "Expr/Clauses/XQueryQuantified.h"
 
 #include <gtest/gtest.h>
 

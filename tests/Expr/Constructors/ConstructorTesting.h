@@ -2,7 +2,7 @@
 // by hand.
 #pragma once
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"

@@ -1,5 +1,5 @@
-#include "Expr/ConstructorTesting.h"
-#include "Expr/XQueryAttributeExpr.h"
+#include "Expr/Constructors/ConstructorTesting.h"
+#include "Expr/Constructors/XQueryAttributeExpr.h"
 
 namespace xquery {
 namespace {

@@ -1,9 +1,9 @@
-#include "Expr/ConstructorTesting.h"
-#include "Expr/XQueryAttributeExpr.h"
-#include "Expr/XQueryElementContentString.h"
-#include "Expr/XQueryElementExpr.h"
-#include "Expr/XQueryNodeExprs.h"
-#include "Platform/ProcessorTime.h"
+#include "Expr/Constructors/ConstructorTesting.h"
+#include "Expr/Constructors/XQueryAttributeExpr.h"
+#include "Expr/Constructors/XQueryElementContentString.h"
+#include "Expr/Constructors/XQueryElementExpr.h"
+#include "Expr/Constructors/XQueryNodeExprs.h"
+#include "Platform/Base/ProcessorTime.h"
 
 #include <memory>
 #include <thread>

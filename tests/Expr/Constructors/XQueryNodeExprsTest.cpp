@@ -1,5 +1,5 @@
-#include "Expr/ConstructorTesting.h"
-#include "Expr/XQueryNodeExprs.h"
+#include "Expr/Constructors/ConstructorTesting.h"
+#include "Expr/Constructors/XQueryNodeExprs.h"
 
 namespace xquery {
 namespace {

@@ -1,7 +1,7 @@
 // The operators over dates, times and durations: every pair of operand types under every operator.
-#include "Expr/OperatorTestSupport.h"
-#include "Expr/XQueryArithmetic.h"
-#include "Expr/XQueryComparison.h"
+#include "Expr/Operators/OperatorTestSupport.h"
+#include "Expr/Operators/XQueryArithmetic.h"
+#include "Expr/Operators/XQueryComparison.h"
 
 #include <gtest/gtest.h>
 

@@ -1,7 +1,7 @@
 // The shortcuts of the operators against their plain algorithms, over generated operands.
-#include "Expr/OperatorTestSupport.h"
-#include "Expr/XQueryArithmetic.h"
-#include "Expr/XQueryComparison.h"
+#include "Expr/Operators/OperatorTestSupport.h"
+#include "Expr/Operators/XQueryArithmetic.h"
+#include "Expr/Operators/XQueryComparison.h"
 #include "Expr/XQueryLeaves.h"
 #include "Types/XQueryAtomization.h"
 

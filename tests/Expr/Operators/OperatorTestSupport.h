@@ -1,8 +1,8 @@
 // Values, and a readable form of answers, for the tests of the operators.
 #pragma once
 
-#include "Eval/XQueryContextInternal.h"
-#include "Expr/XQueryOperatorExpr.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"

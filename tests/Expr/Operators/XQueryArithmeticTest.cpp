@@ -1,5 +1,5 @@
-#include "Expr/OperatorTestSupport.h"
-#include "Expr/XQueryArithmetic.h"
+#include "Expr/Operators/OperatorTestSupport.h"
+#include "Expr/Operators/XQueryArithmetic.h"
 
 #include <gtest/gtest.h>
 

@@ -1,5 +1,5 @@
-#include "Expr/OperatorTestSupport.h"
-#include "Expr/XQueryComparison.h"
+#include "Expr/Operators/OperatorTestSupport.h"
+#include "Expr/Operators/XQueryComparison.h"
 
 #include <gtest/gtest.h>
 

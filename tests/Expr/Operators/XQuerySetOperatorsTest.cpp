@@ -1,4 +1,4 @@
-#include "Expr/OperatorTestSupport.h"
+#include "Expr/Operators/OperatorTestSupport.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "Expr/NodeOrder.h"
+#include "Expr/Paths/NodeOrder.h"
 #include "PathTesting.h"
 #include "xquery/Number.h"
 

@@ -4,8 +4,8 @@
 // order numbers, ends walks early and replaces "//" by a descendant walk. The reference below does
 // none of that: it evaluates a path step by step over complete lists, collects through a set,
 // decides order by climbing, and leaves every focus as the rules have it.
-#include "Expr/NodeOrder.h"
-#include "Expr/XQueryPathResults.h"
+#include "Expr/Paths/NodeOrder.h"
+#include "Expr/Paths/XQueryPathResults.h"
 #include "Expr/XQuerySequence.h"
 #include "PathReference.h"
 #include "Types/XQueryAtomization.h"

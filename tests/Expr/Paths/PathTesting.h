@@ -1,13 +1,13 @@
 // Shorthands for building paths by hand and for reading their results.
 #pragma once
 
-#include "Eval/XQueryContextInternal.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/Paths/XQueryPath.h"
 #include "Expr/ProbeExpr.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
-#include "Expr/XQueryNameTest.h"
-#include "Expr/XQueryPath.h"
-#include "Expr/XQueryTypeDeclaration.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"

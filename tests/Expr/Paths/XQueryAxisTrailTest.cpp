@@ -1,4 +1,4 @@
-#include "Expr/XQueryAxisTrail.h"
+#include "Expr/Paths/XQueryAxisTrail.h"
 #include "Functions/FunctionsTesting.h"
 #include "PathReference.h"
 

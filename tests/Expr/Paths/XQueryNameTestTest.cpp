@@ -1,4 +1,4 @@
-#include "Expr/XQueryNameTest.h"
+#include "Expr/Paths/XQueryNameTest.h"
 #include "PathTesting.h"
 
 namespace xquery {

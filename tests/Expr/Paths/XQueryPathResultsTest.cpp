@@ -1,4 +1,4 @@
-#include "Expr/XQueryPathResults.h"
+#include "Expr/Paths/XQueryPathResults.h"
 #include "PathTesting.h"
 #include "Types/XQueryNumber.h"
 

@@ -1,5 +1,5 @@
-#include "Expr/XQueryPath.h"
-#include "Expr/XQueryPathResults.h"
+#include "Expr/Paths/XQueryPath.h"
+#include "Expr/Paths/XQueryPathResults.h"
 #include "Expr/XQuerySequence.h"
 #include "PathTesting.h"
 #include "xquery/Number.h"

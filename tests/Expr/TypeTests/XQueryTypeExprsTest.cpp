@@ -1,5 +1,5 @@
 #include "Expr/BindingTesting.h"
-#include "Expr/XQueryTypeExprs.h"
+#include "Expr/TypeTests/XQueryTypeExprs.h"
 
 #include <gtest/gtest.h>
 

@@ -1,5 +1,5 @@
 #include "Expr/BindingTesting.h"
-#include "Expr/XQueryTypeswitch.h"
+#include "Expr/TypeTests/XQueryTypeswitch.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "Platform/NSLog.h"
+#include "Platform/Base/NSLog.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Collection.h"
 #include "xquery/Data.h"
 #include "xquery/Number.h"

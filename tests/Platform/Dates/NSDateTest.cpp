@@ -1,4 +1,4 @@
-#include "Platform/GregorianCalendar.h"
+#include "Platform/Dates/GregorianCalendar.h"
 #include "xquery/Date.h"
 
 #include <gtest/gtest.h>

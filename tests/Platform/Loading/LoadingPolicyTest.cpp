@@ -1,4 +1,4 @@
-#include "Platform/LoadingTestSupport.h"
+#include "Platform/Loading/LoadingTestSupport.h"
 #include "xquery/Loading.h"
 
 namespace xquery {

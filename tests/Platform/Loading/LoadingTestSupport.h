@@ -1,7 +1,7 @@
 // A folder of its own for each test, and loading in few words.
 #pragma once
 
-#include "Platform/NSURLLoader.h"
+#include "Platform/Loading/NSURLLoader.h"
 
 #include <gtest/gtest.h>
 

@@ -1,7 +1,7 @@
 // Fetching, under policies and within limits.
-#include "Platform/HTTPServer.h"
-#include "Platform/LoadingTestSupport.h"
-#include "Platform/NSURLLoader.h"
+#include "Platform/Loading/HTTPServer.h"
+#include "Platform/Loading/LoadingTestSupport.h"
+#include "Platform/Loading/NSURLLoader.h"
 
 #include <chrono>
 #include <fcntl.h>

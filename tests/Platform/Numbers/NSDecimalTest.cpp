@@ -1,4 +1,4 @@
-#include "Platform/ProcessorTime.h"
+#include "Platform/Base/ProcessorTime.h"
 #include "xquery/Number.h"
 
 #include <gtest/gtest.h>

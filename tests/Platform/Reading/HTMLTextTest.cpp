@@ -1,5 +1,5 @@
-#include "Platform/HTMLText.h"
-#include "Platform/ProcessorTime.h"
+#include "Platform/Base/ProcessorTime.h"
+#include "Platform/Reading/HTMLText.h"
 
 #include <gtest/gtest.h>
 

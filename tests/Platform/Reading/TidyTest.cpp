@@ -1,10 +1,10 @@
 // HTML, tidied and then parsed like any document.
-#include "Platform/LoadingTestSupport.h"
-#include "Platform/ProcessorTime.h"
-#include "Platform/TextTestSupport.h"
-#include "Platform/ThreadTestSupport.h"
-#include "Platform/Tidy.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/ProcessorTime.h"
+#include "Platform/Base/ThreadTestSupport.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Loading/LoadingTestSupport.h"
+#include "Platform/Reading/Tidy.h"
+#include "Platform/Text/TextTestSupport.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>

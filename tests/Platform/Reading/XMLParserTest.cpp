@@ -1,7 +1,7 @@
-#include "Platform/LibXML.h"
-#include "Platform/LoadingTestSupport.h"
-#include "Platform/XMLTestSupport.h"
-#include "Platform/XMLTree.h"
+#include "Platform/Loading/LoadingTestSupport.h"
+#include "Platform/Reading/LibXML.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/XMLTestSupport.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>

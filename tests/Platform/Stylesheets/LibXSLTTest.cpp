@@ -1,8 +1,8 @@
 // Stylesheets and documents that would nest, work or grow without end, and the threads they run on.
-#include "Platform/LibXSLT.h"
-#include "Platform/StylesheetTestSupport.h"
-#include "Platform/ThreadTestSupport.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/ThreadTestSupport.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Stylesheets/LibXSLT.h"
+#include "Platform/Stylesheets/StylesheetTestSupport.h"
 
 #include <chrono>
 #include <cstdlib>

@@ -1,7 +1,7 @@
-#include "Platform/LibXSLT.h"
-#include "Platform/LoadingTestSupport.h"
-#include "Platform/StylesheetTestSupport.h"
-#include "Platform/XMLStylesheet.h"
+#include "Platform/Loading/LoadingTestSupport.h"
+#include "Platform/Stylesheets/LibXSLT.h"
+#include "Platform/Stylesheets/Stylesheet.h"
+#include "Platform/Stylesheets/StylesheetTestSupport.h"
 #include "xquery/Error.h"
 
 #include <gtest/gtest.h>

@@ -1,7 +1,7 @@
 // Stylesheets in few words, and what becomes of documents under them.
 #pragma once
 
-#include "Platform/XMLStylesheet.h"
+#include "Platform/Stylesheets/Stylesheet.h"
 #include "xquery/Error.h"
 #include "xquery/Loading.h"
 #include "xquery/XMLNode.h"

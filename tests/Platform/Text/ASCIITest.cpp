@@ -1,4 +1,4 @@
-#include "Platform/ASCII.h"
+#include "Platform/Text/ASCII.h"
 
 #include <gtest/gtest.h>
 

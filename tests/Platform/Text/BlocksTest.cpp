@@ -1,4 +1,4 @@
-#include "Platform/TextBlocks.h"
+#include "Platform/Text/Blocks.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "Platform/TextEncoding.h"
+#include "Platform/Text/Encoding.h"
 
 #include <gtest/gtest.h>
 

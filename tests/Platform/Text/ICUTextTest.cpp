@@ -1,5 +1,5 @@
-#include "Platform/ICUText.h"
-#include "Platform/ProcessorTime.h"
+#include "Platform/Base/ProcessorTime.h"
+#include "Platform/Text/ICUText.h"
 
 #include <gtest/gtest.h>
 

@@ -1,7 +1,7 @@
 // Both representations of a text must give the same answers, so most tests ask every question of
 // all four pairings over generated texts and compare with a plain implementation.
-#include "Platform/ProcessorTime.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/ProcessorTime.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/String.h"
 
 #include <gtest/gtest.h>

@@ -1,4 +1,4 @@
-#include "Platform/PCREClassicSyntax.h"
+#include "Platform/Text/PCREClassicSyntax.h"
 
 #include <gtest/gtest.h>
 

@@ -1,7 +1,7 @@
-#include "Platform/PCRE.h"
-#include "Platform/ProcessorTime.h"
-#include "Platform/TextTestSupport.h"
-#include "Platform/WorkMeter.h"
+#include "Platform/Base/ProcessorTime.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/PCRE.h"
+#include "Platform/Text/TextTestSupport.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "Platform/UTF16.h"
+#include "Platform/Text/UTF16.h"
 
 #include <gtest/gtest.h>
 

@@ -1,9 +1,9 @@
 // The structure of trees, document order, merging. What is computed lazily or by counting is
 // checked against a plain walk over generated trees.
-#include "Platform/WorkMeter.h"
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTestSupport.h"
-#include "Platform/XMLTree.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
+#include "Platform/Tree/XMLTestSupport.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>

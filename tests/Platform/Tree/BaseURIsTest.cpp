@@ -1,4 +1,4 @@
-#include "Platform/XMLTree.h"
+#include "Platform/Tree/Arena.h"
 
 #include <gtest/gtest.h>
 

@@ -1,6 +1,6 @@
-#include "Platform/ProcessorTime.h"
-#include "Platform/XMLTestSupport.h"
-#include "Platform/XMLTree.h"
+#include "Platform/Base/ProcessorTime.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/XMLTestSupport.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>

@@ -1,5 +1,5 @@
-#include "Platform/XMLNames.h"
-#include "Platform/XMLTree.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 
 #include <gtest/gtest.h>
 
