@@ -1,6 +1,5 @@
 #include "Context/XQueryContextInternal.h"
 
-#include "Expr/Clauses/XQueryJoinMemo.h"
 #include "Functions/XQueryRegExCache.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Base/WorkMeter.h"
@@ -33,9 +32,7 @@ uint64_t nextBaseURIOwner() {
 }  // namespace
 
 XQueryContextInternal::XQueryContextInternal()
-    : _baseURIOwner(nextBaseURIOwner()),
-      _loader(NSURLLoader::loaderWithLoading()),
-      _joinMemo(std::make_unique<XQueryJoinMemo>()) {}
+    : _baseURIOwner(nextBaseURIOwner()), _loader(NSURLLoader::loaderWithLoading()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;
 

@@ -2,6 +2,7 @@
 // error and what is kept from one evaluation to the next.
 #pragma once
 
+#include "Context/KeptValues.h"
 #include "Context/XQueryFrame.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Types/XQueryQName.h"
@@ -19,7 +20,6 @@
 namespace xquery {
 
 class XQueryDate;
-class XQueryJoinMemo;
 class XQueryProlog;
 class XQueryRegExCache;
 
@@ -118,8 +118,8 @@ class XQueryContextInternal {
   std::shared_ptr<XQueryClient> client() const { return _client; }
   void setClient(std::shared_ptr<XQueryClient> client) { _client = std::move(client); }
 
-  // The tables that joins of this evaluation have made.
-  XQueryJoinMemo& joinMemo() { return *_joinMemo; }
+  // What expressions keep for their next evaluation within this one of the query.
+  XQueryKeptValues& keptValues() { return _keptValues; }
   // The regular expressions compiled last.
   XQueryRegExCache& regExCache();
 
@@ -142,7 +142,7 @@ class XQueryContextInternal {
   Ref<NSURLLoader> _loader;
   NSURLTable<Value> _documentCache;  // documents, NSNull for failures
   NSURLTable<Ref<NSURLHandle>> _URLCache;
-  std::unique_ptr<XQueryJoinMemo> _joinMemo;
+  XQueryKeptValues _keptValues;
   Ref<XQueryError> _error;
   Ref<XQueryDate> _currentDateTime;
   XQueryProlog* _prolog = nullptr;

@@ -5,7 +5,6 @@
 #include "Context/XQueryContextInternal.h"
 #include "Context/XQueryGlobals.h"
 #include "Engine/XQueryInternal.h"
-#include "Expr/Clauses/XQueryJoinMemo.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/NSLog.h"
 #include "Prolog/XQueryProlog.h"
@@ -141,14 +140,14 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   if (compiled.isError()) return shapedResult(query.parseErrors(), error);
 
   context._clearGlobals();
-  context.joinMemo().clear();
+  context.keptValues().clear();
   if (contextItem && !isNull(contextItem)) context.setContextItem(contextItem, 1);
   XQueryProlog& prolog = *compiled.prolog();
   context.setOrdered(prolog.ordered());
   context.setActiveProlog(&prolog);
   const Value result = evaluateModule(compiled, constants);
   context._clearGlobals();
-  context.joinMemo().clear();
+  context.keptValues().clear();
   return shapedResult(result, error);
 }
 

@@ -3,7 +3,6 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryClauseItems.h"
 #include "Expr/Clauses/XQueryFLWOR.h"
-#include "Expr/Clauses/XQueryJoinMemo.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQuerySequence.h"
@@ -91,27 +90,29 @@ Answer answerOf(const std::vector<const XQueryExpr*>& conditions, XQueryContext&
 }
 
 bool looksAway(const XQueryExpr& owner, XQueryContext& context) {
-  return XQueryLogEnabled() || context._internal().joinMemo().looksAway(owner);
+  return XQueryLogEnabled() || context._internal().keptValues().looksAway(owner);
 }
 
-// Asks the memo, makes the table when it is worth it, and asks the table.
+// Asks for the table kept, makes one when it is worth it, and asks the table.
 template <class MakeTable>
-std::shared_ptr<XQueryJoinTable> selectFromMemo(const XQueryExpr& owner,
+std::shared_ptr<XQueryJoinTable> selectFromKept(const XQueryExpr& owner,
                                                 std::span<const Value> dependencies,
                                                 const XQueryJoinCondition& condition,
                                                 XQueryContext& context,
                                                 XQueryJoinTable::Selection& selection,
                                                 MakeTable makeTable) {
+  std::shared_ptr<XQueryKeptValue> kept;
   std::shared_ptr<XQueryJoinTable> table;
-  switch (context._internal().joinMemo().use(owner, dependencies, table)) {
-    case XQueryJoinMemo::Use::First:
+  switch (context._internal().keptValues().use(owner, dependencies, kept)) {
+    case XQueryKeptValues::Use::First:
       return nullptr;
-    case XQueryJoinMemo::Use::Second:
+    case XQueryKeptValues::Use::Second:
       table = makeTable();
       if (table && !table->isComplete()) table = nullptr;
-      context._internal().joinMemo().keep(owner, table);
+      context._internal().keptValues().keep(owner, table);
       break;
-    case XQueryJoinMemo::Use::Further:
+    case XQueryKeptValues::Use::Further:
+      table = std::static_pointer_cast<XQueryJoinTable>(kept);
       break;
   }
   if (!table || !staysInRound(condition, context)) return nullptr;
@@ -167,7 +168,7 @@ std::shared_ptr<XQueryJoinTable> XQueryForJoin::select(
     dependencies[count++] = dynamic.variableForID(varID);
   }
   const std::span<const Value> known(dependencies.data(), count);
-  return selectFromMemo(owner, known, _condition, context, selection, [&] {
+  return selectFromKept(owner, known, _condition, context, selection, [&] {
     return _itemReads.outside && !areInDocuments(known) ? nullptr : makeTable(context);
   });
 }
@@ -259,7 +260,7 @@ std::shared_ptr<XQueryJoinTable> XQueryPathJoin::select(
     dynamic.setContextItem(item, position);
     return table;
   };
-  return selectFromMemo(owner, {&start, 1}, _condition, context, selection, makeTable);
+  return selectFromKept(owner, {&start, 1}, _condition, context, selection, makeTable);
 }
 
 }  // namespace xquery

@@ -13,6 +13,7 @@
 // items too and leaves it to the caller to ask for each.
 #pragma once
 
+#include "Context/KeptValues.h"
 #include "Expr/Clauses/XQueryJoinCondition.h"
 #include "Expr/Operators/XQueryUntypedText.h"
 #include "xquery/Object.h"
@@ -25,7 +26,7 @@
 
 namespace xquery {
 
-class XQueryJoinTable {
+class XQueryJoinTable final : public XQueryKeptValue {
  public:
   struct Match {
     uint32_t position;  // of the item, counted from 0
@@ -47,9 +48,7 @@ class XQueryJoinTable {
   // The positions count the items, which the table keeps alive.
   XQueryJoinTable(const XQueryJoinCondition& condition, std::vector<Value> items,
                   const KeyReader& keyOf);
-  XQueryJoinTable(const XQueryJoinTable&) = delete;
-  XQueryJoinTable& operator=(const XQueryJoinTable&) = delete;
-  ~XQueryJoinTable();
+  ~XQueryJoinTable() override;
 
   // Whether it holds all keys. It does not when they are too many, or would take too much of the
   // memory that is left to the evaluation; such a table must not be asked.

@@ -1,4 +1,4 @@
-#include "Expr/Clauses/XQueryJoinMemo.h"
+#include "Context/KeptValues.h"
 #include "Expr/XQueryLeaves.h"
 #include "Functions/FunctionsTesting.h"
 
@@ -15,24 +15,24 @@ namespace {
 using functiontest::integer;
 using functiontest::string;
 
-std::string uses(XQueryJoinMemo& memo, const std::vector<Value>& dependencies) {
+std::string uses(XQueryKeptValues& values, const std::vector<Value>& dependencies) {
   const Ref<XQueryExpr> owner = XQueryLiteral::literalWithValue(integer(0));
   std::string text;
   for (const Value& dependency : dependencies) {
-    if (memo.looksAway(*owner)) {
+    if (values.looksAway(*owner)) {
       text += "-";
       continue;
     }
-    std::shared_ptr<XQueryJoinTable> table;
-    switch (memo.use(*owner, {&dependency, 1}, table)) {
-      case XQueryJoinMemo::Use::First:
+    std::shared_ptr<XQueryKeptValue> kept;
+    switch (values.use(*owner, {&dependency, 1}, kept)) {
+      case XQueryKeptValues::Use::First:
         text += "1";
         break;
-      case XQueryJoinMemo::Use::Second:
+      case XQueryKeptValues::Use::Second:
         text += "2";
-        memo.keep(*owner, nullptr);
+        values.keep(*owner, nullptr);
         break;
-      case XQueryJoinMemo::Use::Further:
+      case XQueryKeptValues::Use::Further:
         text += "+";
         break;
     }
@@ -40,20 +40,20 @@ std::string uses(XQueryJoinMemo& memo, const std::vector<Value>& dependencies) {
   return text;
 }
 
-TEST(JoinMemo, KnowsTheUsesInARowWithTheSameDependencies) {
-  XQueryJoinMemo memo;
+TEST(KeptValues, KnowsTheUsesInARowWithTheSameDependencies) {
+  XQueryKeptValues values;
   const Value a = string("a");
   const Value b = string("b");
-  EXPECT_EQ(uses(memo, {a, a, a, a, b, b, b, a, b, b}), "12++12+112");
+  EXPECT_EQ(uses(values, {a, a, a, a, b, b, b, a, b, b}), "12++12+112");
 }
 
-TEST(JoinMemo, LooksNowAndThenOnlyAfterManyFirstUses) {
-  XQueryJoinMemo memo;
+TEST(KeptValues, LooksNowAndThenOnlyAfterManyFirstUses) {
+  XQueryKeptValues values;
   std::vector<Value> dependencies;
   for (int i = 0; i < 1000; ++i) dependencies.push_back(string(std::to_string(i)));
   const Value again = string("again");
   dependencies.insert(dependencies.end(), 50, again);
-  const std::string text = uses(memo, dependencies);
+  const std::string text = uses(values, dependencies);
   EXPECT_EQ(text.find('-'), 16U);
   EXPECT_LT(std::count(text.begin(), text.begin() + 1000, '1'), 100);
   EXPECT_GT(text.find('2'), 1000U);

@@ -1,11 +1,11 @@
-#include "Expr/Clauses/XQueryJoinMemo.h"
+#include "Context/KeptValues.h"
 
 #include <algorithm>
 
 namespace xquery {
 
 // After a few first uses in a row all but two, one after the other, of every so many uses.
-bool XQueryJoinMemo::looksAway(const XQueryExpr& expr) {
+bool XQueryKeptValues::looksAway(const XQueryExpr& expr) {
   constexpr uint32_t patience = 16;
   constexpr uint32_t period = 32;
   const auto found = _entries.find(&expr);
@@ -17,27 +17,28 @@ bool XQueryJoinMemo::looksAway(const XQueryExpr& expr) {
   return false;
 }
 
-XQueryJoinMemo::Use XQueryJoinMemo::use(const XQueryExpr& expr, std::span<const Value> dependencies,
-                                        std::shared_ptr<XQueryJoinTable>& table) {
+XQueryKeptValues::Use XQueryKeptValues::use(const XQueryExpr& expr,
+                                            std::span<const Value> dependencies,
+                                            std::shared_ptr<XQueryKeptValue>& kept) {
   const auto [found, isNew] = _entries.try_emplace(&expr);
   Entry& entry = found->second;
   auto& known = entry.dependencies;
   if (isNew || !std::equal(known.begin(), known.end(), dependencies.begin(), dependencies.end())) {
     known.assign(dependencies.begin(), dependencies.end());
     entry.isDecided = false;
-    entry.table = nullptr;
+    entry.value = nullptr;
     ++entry.firsts;
     return Use::First;
   }
   entry.firsts = 0;
-  table = entry.table;
+  kept = entry.value;
   return entry.isDecided ? Use::Further : Use::Second;
 }
 
-void XQueryJoinMemo::keep(const XQueryExpr& expr, std::shared_ptr<XQueryJoinTable> table) {
+void XQueryKeptValues::keep(const XQueryExpr& expr, std::shared_ptr<XQueryKeptValue> value) {
   Entry& entry = _entries[&expr];
   entry.isDecided = true;
-  entry.table = std::move(table);
+  entry.value = std::move(value);
 }
 
 }  // namespace xquery
