@@ -1,8 +1,52 @@
 #include "Context/KeptValues.h"
 
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "xquery/Collection.h"
+
 #include <algorithm>
 
 namespace xquery {
+namespace {
+
+// Asks for each tree once as long as its nodes come in a row: a list may hold very many that lie
+// very deep.
+class SettledNodes {
+ public:
+  explicit SettledNodes(bool around) : _around(around) {}
+
+  bool holds(const NSObject* item) {
+    const auto* node = dyn_cast<NSXMLNode>(item);
+    if (!node || isInLastTree(node)) return true;
+    const NSXMLNode* root = node->rootNode();
+    _lastTree = NSXMLTree::of(node);
+    return !NSXMLTree::isUnfinished(root) && (!_around || root->kind() == Kind::Document);
+  }
+
+ private:
+  bool isInLastTree(const NSXMLNode* node) const {
+    return _lastTree == NSXMLTree::of(node) && !_lastTree->hasSeveralRoots();
+  }
+
+  const bool _around;
+  const NSXMLTree* _lastTree = nullptr;
+};
+
+}  // namespace
+
+bool XQueryAreSettled(std::span<const Value> values, bool around) {
+  SettledNodes settled(around);
+  WorkPacer pacer;
+  const auto isSettled = [&](const Value& item) {
+    pacer.turn();
+    return settled.holds(item.get());
+  };
+  return std::all_of(values.begin(), values.end(), [&](const Value& value) {
+    const auto* items = dyn_cast<NSArray>(value);
+    return items ? std::all_of(items->objects().begin(), items->objects().end(), isSettled)
+                 : isSettled(value);
+  });
+}
 
 // After a few first uses in a row all but two, one after the other, of every so many uses.
 bool XQueryKeptValues::looksAway(const XQueryExpr& expr) {
@@ -17,20 +61,26 @@ bool XQueryKeptValues::looksAway(const XQueryExpr& expr) {
   return false;
 }
 
+uint64_t XQueryKeptValues::stamp() const {
+  return _globalChanges + NSXMLTree::finishedChangeCount();
+}
+
 XQueryKeptValues::Use XQueryKeptValues::use(const XQueryExpr& expr,
-                                            std::span<const Value> dependencies,
+                                            std::span<const Value> dependencies, bool looksAround,
                                             std::shared_ptr<XQueryKeptValue>& kept) {
-  const auto [found, isNew] = _entries.try_emplace(&expr);
-  Entry& entry = found->second;
+  Entry& entry = _entries[&expr];
   auto& known = entry.dependencies;
-  if (isNew || !std::equal(known.begin(), known.end(), dependencies.begin(), dependencies.end())) {
+  if (entry.stamp != stamp() ||
+      !std::equal(known.begin(), known.end(), dependencies.begin(), dependencies.end())) {
     known.assign(dependencies.begin(), dependencies.end());
+    entry.stamp = stamp();
     entry.isDecided = false;
     entry.value = nullptr;
     ++entry.firsts;
     return Use::First;
   }
   entry.firsts = 0;
+  if (!entry.isDecided && !XQueryAreSettled(dependencies, looksAround)) entry.isDecided = true;
   kept = entry.value;
   return entry.isDecided ? Use::Further : Use::Second;
 }

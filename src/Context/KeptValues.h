@@ -1,5 +1,20 @@
 // What one evaluation keeps of an expression for the expression's next evaluation, by expression.
 //
+// A value is kept only while nothing it was made from has changed. What it is made from are the
+// values that the expression depends on, what is inside their nodes, and what is around these where
+// the expression looks there.
+//
+//   other values to depend on       their identity is compared
+//   a node that is being filled     nothing is kept: whoever holds a node that was taken into a new
+//                                   element sees that element grow between two of its content items
+//   what is around other nodes      nothing is kept unless they are in documents: a node without a
+//                                   parent may be taken into an element at any time
+//   any other change of a tree,     a stamp is compared, so that the host may change its trees
+//   while and of a global variable        it is called back, and a declaration may replace a global
+//
+// So a use compares a few words, whatever the size of what was kept, and writes nothing that
+// another thread could look at.
+//
 // An expression has one kept value at most, for what it depended on when the value was made. What
 // is kept says itself what it is: a join keeps a table of keys. It is worth its making only when it
 // is used again, so it is made when the expression is evaluated the second time with the same
@@ -20,6 +35,10 @@ namespace xquery {
 
 class XQueryExpr;
 
+// Whether what is inside the nodes of the values stays as it is until a stamp changes, and what is
+// around them where that is asked for.
+bool XQueryAreSettled(std::span<const Value> values, bool around);
+
 class XQueryKeptValue {
  public:
   XQueryKeptValue() = default;
@@ -37,21 +56,29 @@ class XQueryKeptValues {
   };
   // To be asked before every use: whether to take the plain way without looking.
   bool looksAway(const XQueryExpr& expr);
-  // What is compared of the dependencies is their identity; they are kept alive.
-  Use use(const XQueryExpr& expr, std::span<const Value> dependencies,
+  // The dependencies are all that the expression reads, globals apart; they are kept alive.
+  Use use(const XQueryExpr& expr, std::span<const Value> dependencies, bool looksAround,
           std::shared_ptr<XQueryKeptValue>& kept);
   // A null value stands for: take the plain way as long as the dependencies are these.
   void keep(const XQueryExpr& expr, std::shared_ptr<XQueryKeptValue> value);
   void clear() { _entries.clear(); }
+  // Before a global variable gets a value, or another one.
+  void noteGlobalChange() { ++_globalChanges; }
 
  private:
+  // Grows with every change of a finished tree and of a global. What is kept is kept and used by
+  // one thread.
+  uint64_t stamp() const;
+
   struct Entry {
+    uint64_t stamp = UINT64_MAX;  // no stamp
     std::vector<Value> dependencies;
     bool isDecided = false;
     uint32_t firsts = 0;  // in a row
     std::shared_ptr<XQueryKeptValue> value;
   };
 
+  uint64_t _globalChanges = 0;
   std::unordered_map<const XQueryExpr*, Entry> _entries;
 };
 

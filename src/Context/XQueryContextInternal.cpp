@@ -47,6 +47,7 @@ NSObject* XQueryContextInternal::globalForQName(const XQueryQName& qName) const 
 }
 
 void XQueryContextInternal::setGlobal(const Value& value, const Ref<XQueryQName>& forQName) {
+  _keptValues.noteGlobalChange();
   _globals[forQName] = value;
 }
 

@@ -40,27 +40,10 @@ Value valueOrNull(const XQueryExpr& expr, XQueryContext& context) {
   }
 }
 
-// Whether all nodes of the value belong to documents. They stay where they are, while a constructor
-// gives a parent to a node that has none.
-bool isInDocuments(const NSObject* value) {
-  const XQueryItemList list(value);
-  WorkPacer pacer;
-  for (size_t i = 0; i < list.count(); ++i) {
-    pacer.turn();
-    const auto* node = dyn_cast<NSXMLNode>(list[i]);
-    if (node && !node->rootDocument()) return false;
-  }
-  return true;
-}
-bool areInDocuments(std::span<const Value> values) {
-  return std::all_of(values.begin(), values.end(),
-                     [](const Value& value) { return isInDocuments(value.get()); });
-}
-
-// The same where it has to be known for every round.
-bool isBrieflyInDocuments(const NSObject* value) {
+// Where it has to be known for every round.
+bool isBrieflySettledAround(const Value& value) {
   constexpr size_t mostItems = 4096;
-  return XQueryItemList(value).count() <= mostItems && isInDocuments(value);
+  return XQueryItemList(value.get()).count() <= mostItems && XQueryAreSettled({&value, 1}, true);
 }
 
 // Whether what probe and guards find outside their nodes is the same for the whole round, whatever
@@ -70,9 +53,9 @@ bool staysInRound(const XQueryJoinCondition& condition, XQueryContext& context) 
   return std::all_of(
       condition.outward.begin(), condition.outward.end(), [&](const XQueryReads& reads) {
         if (reads.globals) return false;
-        if (reads.focus && !isBrieflyInDocuments(dynamic.contextItem().get())) return false;
+        if (reads.focus && !isBrieflySettledAround(dynamic.contextItem())) return false;
         return std::all_of(reads.variables.begin(), reads.variables.end(), [&](int64_t varID) {
-          return isBrieflyInDocuments(dynamic.variableForID(varID));
+          return isBrieflySettledAround(dynamic.variableForID(varID));
         });
       });
 }
@@ -95,15 +78,13 @@ bool looksAway(const XQueryExpr& owner, XQueryContext& context) {
 
 // Asks for the table kept, makes one when it is worth it, and asks the table.
 template <class MakeTable>
-std::shared_ptr<XQueryJoinTable> selectFromKept(const XQueryExpr& owner,
-                                                std::span<const Value> dependencies,
-                                                const XQueryJoinCondition& condition,
-                                                XQueryContext& context,
-                                                XQueryJoinTable::Selection& selection,
-                                                MakeTable makeTable) {
+std::shared_ptr<XQueryJoinTable> selectFromKept(
+    const XQueryExpr& owner, std::span<const Value> dependencies, bool looksAround,
+    const XQueryJoinCondition& condition, XQueryContext& context,
+    XQueryJoinTable::Selection& selection, MakeTable makeTable) {
   std::shared_ptr<XQueryKeptValue> kept;
   std::shared_ptr<XQueryJoinTable> table;
-  switch (context._internal().keptValues().use(owner, dependencies, kept)) {
+  switch (context._internal().keptValues().use(owner, dependencies, looksAround, kept)) {
     case XQueryKeptValues::Use::First:
       return nullptr;
     case XQueryKeptValues::Use::Second:
@@ -168,9 +149,8 @@ std::shared_ptr<XQueryJoinTable> XQueryForJoin::select(
     dependencies[count++] = dynamic.variableForID(varID);
   }
   const std::span<const Value> known(dependencies.data(), count);
-  return selectFromKept(owner, known, _condition, context, selection, [&] {
-    return _itemReads.outside && !areInDocuments(known) ? nullptr : makeTable(context);
-  });
+  return selectFromKept(owner, known, _itemReads.outside, _condition, context, selection,
+                        [&] { return makeTable(context); });
 }
 
 std::shared_ptr<XQueryJoinTable> XQueryForJoin::makeTable(XQueryContext& context) const {
@@ -187,7 +167,7 @@ std::shared_ptr<XQueryJoinTable> XQueryForJoin::makeTable(XQueryContext& context
     if (!keepsIdentity && !list[i]->isNode()) return nullptr;
     items.emplace_back(list[i]);
   }
-  if (!isWorthATable(items) || (_condition.looksOutOfItems && !areInDocuments(items))) {
+  if (!isWorthATable(items) || (_condition.looksOutOfItems && !XQueryAreSettled(items, true))) {
     return nullptr;
   }
   const auto keyOf = [&](size_t position) {
@@ -245,10 +225,9 @@ std::shared_ptr<XQueryJoinTable> XQueryPathJoin::select(
     XQueryContext& context, XQueryJoinTable::Selection& selection) const {
   if (looksAway(owner, context)) return nullptr;
   const auto makeTable = [&]() -> std::shared_ptr<XQueryJoinTable> {
-    if (_looksOutOfStart && !isInDocuments(start.get())) return nullptr;
     std::vector<Value> items;
     if (!listItems(items) || !isWorthATable(items)) return nullptr;
-    if (_condition.looksOutOfItems && !areInDocuments(items)) return nullptr;
+    if (_condition.looksOutOfItems && !XQueryAreSettled(items, true)) return nullptr;
     auto& dynamic = context._internal();
     const Value item = dynamic.contextItem();
     const int64_t position = dynamic.position();
@@ -260,7 +239,8 @@ std::shared_ptr<XQueryJoinTable> XQueryPathJoin::select(
     dynamic.setContextItem(item, position);
     return table;
   };
-  return selectFromKept(owner, {&start, 1}, _condition, context, selection, makeTable);
+  return selectFromKept(owner, {&start, 1}, _looksOutOfStart, _condition, context, selection,
+                        makeTable);
 }
 
 }  // namespace xquery

@@ -57,6 +57,9 @@ class XQueryContent {
   const int64_t _line;
 
  private:
+  // A node that was taken in leads up to the parent while it still grows.
+  const NSXMLUnfinished _unfinished{_parent};
+
   void addItem(NSObject* item);
   void addItems(const std::vector<Value>& items);
   void addNode(NSXMLNode& node);

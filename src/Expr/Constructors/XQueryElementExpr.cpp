@@ -90,11 +90,11 @@ Value XQueryElementExpr::evaluateWithContext(XQueryContext& context) const {
   NSXMLRoom room;
   const Ref<NSXMLElement> element =
       NSXMLTree::makeLoneElement(_name.evaluate(context, exprLine()).detach(), _roomBytes, room);
+  XQueryElementContent content(*element, room, namespaces, context, exprLine());
   dynamic.setBaseURI(dynamic.baseURI(), element.get());
   for (const auto& declaration : _namespaces) element->addNamespace(declaration->copy());
   namespaces.updateNamespacesForElement(*element, *element->nodeName());
 
-  XQueryElementContent content(*element, room, namespaces, context, exprLine());
   for (const auto& expr : _attributes) {
     if (const auto* attribute = dyn_cast<XQueryAttributeExpr>(expr.get())) {
       attribute->addTo(content, context);

@@ -57,6 +57,7 @@ bool XQueryInScopeNamespaces::updateNamespacesForElement(NSXMLElement& element,
 // There may be very many: each is linked behind the last one, and a table finds the prefixes that
 // the copy declares itself.
 void XQueryInScopeNamespaces::keepNamespaces(NSXMLElement& copy, const NSXMLElement& formerParent) {
+  const NSXMLUnfinished unfinished(copy);
   std::unordered_set<const NSXMLName*> own;
   NSXMLNode* last = nullptr;
   WorkPacer pacer;

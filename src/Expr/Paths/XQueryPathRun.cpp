@@ -38,9 +38,9 @@ const NSXMLExpandedName* XQueryPathRun::nameForDeferredTest(const XQueryNameTest
 XQueryAxisTrail& XQueryPathRun::trail(size_t index) {
   if (_trails.empty()) _trails.resize(trailCount);
   Trail& found = _trails[index];
-  if (found.linkCount != NSXMLTree::linkCount()) {
+  if (found.changeCount != NSXMLTree::changeCount()) {
     found.trail = XQueryAxisTrail();
-    found.linkCount = NSXMLTree::linkCount();
+    found.changeCount = NSXMLTree::changeCount();
   }
   return found.trail;
 }

@@ -34,8 +34,8 @@ class XQueryPathRun {
 
   // How many steps of the path keep trails.
   size_t trailCount = 0;
-  // A trail begins anew where a predicate of an earlier step has constructed something since it was
-  // last asked for, since that may have given the nodes a parent.
+  // A trail begins anew where a tree has changed since it was last asked for: what a predicate of
+  // an earlier step constructs may give the nodes a parent.
   XQueryAxisTrail& trail(size_t index);
 
   bool contextHasDefaultNamespace();
@@ -60,7 +60,7 @@ class XQueryPathRun {
   std::deque<std::vector<NSXMLNode*>> _nodeLists;
   struct Trail {
     XQueryAxisTrail trail;
-    uint64_t linkCount = 0;  // NSXMLTree::linkCount at its last use
+    uint64_t changeCount = 0;  // NSXMLTree::changeCount at its last use
   };
   std::vector<Trail> _trails;
   size_t _openNodeLists = 0;

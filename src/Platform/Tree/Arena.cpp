@@ -423,16 +423,29 @@ void NSXMLTree::absorb(NSXMLTree* smaller) {
 
 namespace {
 
-constinit thread_local uint64_t linkedNodes __attribute__((tls_model("initial-exec"))) = 0;
+struct Changes {
+  uint64_t all = 0;
+  uint64_t ofFinished = 0;
+};
+constinit thread_local Changes changes __attribute__((tls_model("initial-exec")));
 
 }  // namespace
 
-uint64_t NSXMLTree::linkCount() {
-  return linkedNodes;
+uint64_t NSXMLTree::changeCount() {
+  return changes.all;
+}
+
+uint64_t NSXMLTree::finishedChangeCount() {
+  return changes.ofFinished;
+}
+
+void NSXMLTree::noteTextChange(const NSXMLNode* node) {
+  if (!isUnfinished(node)) ++changes.ofFinished;
 }
 
 void NSXMLTree::noteChange(const NSXMLNode* parent) {
-  ++linkedNodes;
+  ++changes.all;
+  noteTextChange(parent);
   NSXMLTree* tree = of(parent);
   if (tree->order == Fresh) {
     tree->order = Stale;
@@ -533,6 +546,8 @@ void NSXMLTree::unlink(NSXMLNode* node) {
 }
 
 void NSXMLTree::detach(NSXMLNode* node) {
+  ++changes.all;
+  ++changes.ofFinished;
   NSXMLTree* tree = of(node);
   NSXMLNode* root = node->rootNode();
   unlink(node);

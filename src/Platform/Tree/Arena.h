@@ -144,9 +144,20 @@ class NSXMLTree : public NSXMLTreeHead {
   // null for none.
   static void appendProperty(NSXMLElement* element, NSXMLNode* property, NSXMLNode* last);
   static void detach(NSXMLNode* node);
-  // How many nodes the calling thread has linked so far: as long as it links none, what is around
-  // the nodes of its evaluation stays as it is.
-  static uint64_t linkCount();
+  // How often the calling thread has linked a node or taken one out so far: while the count stays,
+  // the trees of its evaluation stay as they are.
+  static uint64_t changeCount();
+  // The same without what constructors do to the nodes that they are filling, but with new texts of
+  // nodes: while this count stays, so does everything inside the nodes that are finished, and, for
+  // nodes of documents, around them. Only a node without a parent may find itself in another one.
+  static uint64_t finishedChangeCount();
+  static bool isUnfinished(const NSXMLNode* node) { return (node->_flags & unfinished) != 0; }
+  static void setUnfinished(NSXMLNode* node, bool isUnfinished) {
+    node->_flags =
+        static_cast<uint8_t>(isUnfinished ? node->_flags | unfinished : node->_flags & ~unfinished);
+  }
+  // Before the text of a node that may be known changes.
+  static void noteTextChange(const NSXMLNode* node);
   // For builders: the fields of a node, as they are.
   static NSXMLNode*& parentOf(NSXMLNode* node) { return node->_parent; }
   static NSXMLNode*& nextOf(NSXMLNode* node) { return node->_next; }
@@ -175,6 +186,8 @@ class NSXMLTree : public NSXMLTreeHead {
   // whose subtree's numbers are not good, where the tree has several roots.
   static constexpr uint32_t firstOrderNumber = 1;
   static constexpr uint32_t staleRoot = 0;
+  // Whether nodes of the tree may have different roots.
+  bool hasSeveralRoots() const { return __atomic_load_n(&order, __ATOMIC_RELAXED) == SeveralRoots; }
   // Makes the numbers under this root good, by one thread at a time.
   void makeOrderFresh(const NSXMLNode* root);
 
@@ -212,6 +225,10 @@ class NSXMLTree : public NSXMLTreeHead {
   static void unlink(NSXMLNode* node);
   static void renumber(const NSXMLNode* root);
 
+  // A bit of a node's flags beside those of NSXMLNode::Flag, which others may look at: this one is
+  // only ever set while nobody but the thread that makes the node knows it.
+  static constexpr uint8_t unfinished = 1U << 7;
+
   uint8_t blockCountHigh = 0;  // saturates; only compared
   uint16_t blockCountLow = 0;
   NSXMLBlock* _lastBlock = nullptr;
@@ -224,5 +241,17 @@ class NSXMLTree : public NSXMLTreeHead {
 };
 
 static_assert(sizeof(NSXMLTree) == 32 && sizeof(NSXMLBaseURI) == 32);
+
+// The time in which a constructor fills a new node, the root of its tree.
+class NSXMLUnfinished {
+ public:
+  explicit NSXMLUnfinished(NSXMLNode& node) : _node(node) { NSXMLTree::setUnfinished(&node, true); }
+  ~NSXMLUnfinished() { NSXMLTree::setUnfinished(&_node, false); }
+  NSXMLUnfinished(const NSXMLUnfinished&) = delete;
+  NSXMLUnfinished& operator=(const NSXMLUnfinished&) = delete;
+
+ private:
+  NSXMLNode& _node;
+};
 
 }  // namespace xquery

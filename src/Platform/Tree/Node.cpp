@@ -179,6 +179,7 @@ void NSXMLNode::appendStringValueTo(NSMutableString& out) const {
 
 void NSXMLNode::setStringValue(NSStringView text) {
   if (!isBranch()) {
+    NSXMLTree::noteTextChange(this);
     tree()->setText(this, text);
     return;
   }
