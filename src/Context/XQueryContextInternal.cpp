@@ -1,10 +1,10 @@
 #include "Context/XQueryContextInternal.h"
 
-#include "Functions/XQueryRegExCache.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 #include "Prolog/XQueryProlog.h"
+#include "Types/TypesContext.h"
 #include "Types/XQueryDate.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "xquery/Collection.h"
@@ -35,11 +35,6 @@ XQueryContextInternal::XQueryContextInternal()
     : _baseURIOwner(nextBaseURIOwner()), _loader(NSURLLoader::loaderWithLoading()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;
-
-XQueryRegExCache& XQueryContextInternal::regExCache() {
-  if (!_regExCache) _regExCache = std::make_unique<XQueryRegExCache>();
-  return *_regExCache;
-}
 
 NSObject* XQueryContextInternal::globalForQName(const XQueryQName& qName) const {
   const auto found = _globals.find(qName);
@@ -167,6 +162,18 @@ void XQueryContextInternal::setError(Ref<XQueryError> error, bool raiseException
 void XQueryContextInternal::raise(Ref<XQueryError> error) {
   setError(std::move(error), true);
   __builtin_unreachable();
+}
+
+void XQueryRaise(XQueryContext& context, Ref<XQueryError> error) {
+  context._internal().raise(std::move(error));
+}
+
+Ref<NSString> XQueryDefaultElementNamespace(const XQueryContext& context) {
+  return context._internal().defaultElementNamespace();
+}
+
+Ref<NSString> XQueryNamespaceForPrefix(const XQueryContext& context, NSStringView prefix) {
+  return context._internal().namespaceForPrefix(prefix);
 }
 
 Value XQueryContextInternal::XQueryExternalFunctionForQName(const XQueryQName&) const {

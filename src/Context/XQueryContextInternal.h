@@ -120,8 +120,8 @@ class XQueryContextInternal {
 
   // What expressions keep for their next evaluation within this one of the query.
   XQueryKeptValues& keptValues() { return _keptValues; }
-  // The regular expressions compiled last.
-  XQueryRegExCache& regExCache();
+  // The regular expressions compiled last; null until the first one.
+  std::shared_ptr<XQueryRegExCache>& regExCache() { return _regExCache; }
 
   const XQueryLimits& limits() const { return _limits; }
   void setLimits(XQueryLimits limits) { _limits = std::move(limits); }
@@ -148,7 +148,7 @@ class XQueryContextInternal {
   XQueryProlog* _prolog = nullptr;
   std::shared_ptr<XQueryClient> _client;
   XQueryLimits _limits;
-  std::unique_ptr<XQueryRegExCache> _regExCache;
+  std::shared_ptr<XQueryRegExCache> _regExCache;
   Value _contextItem;
   int64_t _position = 0;
   int64_t _last = 0;

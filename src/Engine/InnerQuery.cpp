@@ -1,4 +1,4 @@
-#include "Engine/InnerQuery.h"
+#include "Functions/InnerQuery.h"
 
 #include "Context/LimitWatch.h"
 #include "Context/StackGuard.h"

@@ -1,6 +1,6 @@
 #include "Engine/XQueryInternal.h"
 
-#include "Parser/XQueryParsedModule.h"
+#include "Prolog/XQueryParsedModule.h"
 #include "Parser/XQueryParser.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryModules.h"

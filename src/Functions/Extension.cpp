@@ -1,7 +1,7 @@
 #include "Functions/Extension.h"
 
 #include "Context/XQueryContextInternal.h"
-#include "Engine/InnerQuery.h"
+#include "Functions/InnerQuery.h"
 #include "Functions/URI.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryBinary.h"

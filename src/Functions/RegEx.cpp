@@ -6,6 +6,7 @@
 #include "Types/XQueryTypeTable.h"
 
 #include <array>
+#include <memory>
 
 namespace xquery {
 namespace {
@@ -29,7 +30,9 @@ class Strings {
 };
 
 Ref<XQueryRegEx> compiled(NSStringView pattern, NSStringView flags, XQueryContext& context) {
-  return context._internal().regExCache().regExp(pattern, flags);
+  std::shared_ptr<XQueryRegExCache>& cache = context._internal().regExCache();
+  if (!cache) cache = std::make_shared<XQueryRegExCache>();
+  return cache->regExp(pattern, flags);
 }
 
 }  // namespace

@@ -230,4 +230,9 @@ void XQueryParserSetSetterFlag(unsigned flag, int64_t line) {
   }
 }
 
+XQueryParse XQueryParseModule(const Ref<NSString>& source) {
+  const auto parser = XQueryParser::parserWithSource(source);
+  return {parser->parsedModule(), parser->errors()};
+}
+
 }  // namespace xquery

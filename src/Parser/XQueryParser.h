@@ -7,7 +7,7 @@
 // leaves its objects in an autorelease pool.
 #pragma once
 
-#include "Parser/XQueryParsedModule.h"
+#include "Prolog/XQueryParsedModule.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"

@@ -1,7 +1,7 @@
 #include "Prolog/XQueryModuleImporter.h"
 
-#include "Parser/XQueryParser.h"
 #include "Prolog/XQueryModules.h"
+#include "Prolog/XQueryParsedModule.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
 #include "Types/XQueryErrors.h"
@@ -57,9 +57,8 @@ void XQueryModuleImporter::resolve(Importer& importer) {
 void XQueryModuleImporter::tryLocation(XQueryProlog& importer, const Ref<NSString>& location) {
   const auto source = importer.modules().sourceAtLocation(location);
   if (!source) return;
-  const auto parser = XQueryParser::parserWithSource(source);
-  const auto& module = parser->parsedModule();
-  if (!module || !parser->errors().empty()) return;
+  const auto [module, errors] = XQueryParseModule(source);
+  if (!module || !errors.empty()) return;
   auto prolog = make<XQueryProlog>(Ref<XQueryModules>(&importer.modules()));
   prolog->_start(module->prologItems(), location, module->version());
   _importers.push_back({std::move(prolog)});

@@ -3,7 +3,6 @@
 // stands for which ID.
 #include "Prolog/XQueryProlog.h"
 
-#include "Expr/XQueryLeaves.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryModuleImporter.h"
 #include "Prolog/XQueryModules.h"
@@ -116,7 +115,7 @@ void XQueryProlog::addError(Ref<XQueryError> error) {
   _errors.push_back(std::move(error));
 }
 
-void XQueryProlog::addQNameReference(Ref<XQueryQNameReference> reference) {
+void XQueryProlog::addQNameReference(Ref<XQueryExpr> reference) {
   _qNameReferences.push_back(std::move(reference));
 }
 

@@ -15,6 +15,7 @@
 
 namespace xquery {
 
+class XQueryExpr;
 class XQueryFunctionDecl;
 class NSURLLoader;
 class XQueryModuleImporter;
@@ -22,7 +23,6 @@ class XQueryModules;
 class XQueryPrologItem;
 class XQueryPrologItemModuleImport;
 class XQueryPrologItemSchemaImport;
-class XQueryQNameReference;
 class XQueryVarDecl;
 
 // A function name together with its number of parameters.
@@ -77,7 +77,7 @@ class XQueryProlog : public NSCounted {
   // XQueryVarDecl and XQueryFunctionDecl objects in the order they were registered.
   const std::vector<Value>& declarations() const { return _declarations; }
   const std::vector<Ref<XQueryError>>& errors() const { return _errors; }
-  const std::vector<Ref<XQueryQNameReference>>& qNameReferences() const { return _qNameReferences; }
+  const std::vector<Ref<XQueryExpr>>& qNameReferences() const { return _qNameReferences; }
   const std::vector<Ref<XQueryPrologItemModuleImport>>& moduleImports() const {
     return _moduleImports;
   }
@@ -127,7 +127,7 @@ class XQueryProlog : public NSCounted {
   Ref<XQueryQName> variableQNameFromString(const Ref<NSString>& name) const;
   Ref<XQueryQName> functionQNameFromString(const Ref<NSString>& name) const;
   Ref<XQueryQName> xmlQNameFromString(const Ref<NSString>& name) const;
-  void addQNameReference(Ref<XQueryQNameReference> reference);
+  void addQNameReference(Ref<XQueryExpr> reference);
   void addError(Ref<XQueryError> error);
 
   // --- setters, used by the prolog items ---------------------------------------------------------
@@ -189,7 +189,7 @@ class XQueryProlog : public NSCounted {
   std::vector<Value> _namespacePrefixes;     // by ID: NSNull, a string, or an array of strings
   StringTable<int64_t> _namespacePrefixIDs;  // what was declared, over the predeclared ones
   std::vector<Value> _declarations;
-  std::vector<Ref<XQueryQNameReference>> _qNameReferences;
+  std::vector<Ref<XQueryExpr>> _qNameReferences;
   std::unordered_map<Ref<XQueryQName>, Ref<XQueryVarDecl>, XQueryQNameHash, XQueryQNameEqual>
       _variables;
   std::unordered_map<XQueryFunctionSignature, Ref<XQueryFunctionDecl>, XQueryFunctionSignatureHash>

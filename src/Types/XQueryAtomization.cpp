@@ -1,7 +1,7 @@
 #include "Types/XQueryAtomization.h"
 
-#include "Context/XQueryContextInternal.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Types/TypesContext.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryNumber.h"
@@ -13,7 +13,7 @@ namespace xquery {
 namespace {
 
 [[noreturn]] void raiseWrongCount(XQueryContext& context) {
-  context._internal().raise(XQueryErrors::invalidAtomization.error());
+  XQueryRaise(context, XQueryErrors::invalidAtomization.error());
 }
 
 bool allAtomic(const std::vector<Value>& items) {
@@ -74,7 +74,7 @@ bool effectiveBooleanValueOfItem(const NSObject& item) {
 Value XQueryTypedValue(const Value& item, XQueryContext& context) {
   if (XQueryIsNode(item.get())) return XQueryNodeTypedValue(cast<NSXMLNode>(item));
   if (XQueryIsAtomicType(item.get())) return item;
-  context._internal().raise(XQueryErrors::invalidType.error());
+  XQueryRaise(context, XQueryErrors::invalidType.error());
 }
 
 Value XQueryAtomization(const Value& value, XQueryContext& context) {

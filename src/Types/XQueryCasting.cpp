@@ -5,7 +5,7 @@
 // only.
 #include "Types/XQueryCasting.h"
 
-#include "Context/XQueryContextInternal.h"
+#include "Types/TypesContext.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryBinary.h"
 #include "Types/XQueryDate.h"
@@ -141,9 +141,10 @@ Value stringToQName(const Cast& cast) {
   Ref<NSString> prefix;
   Ref<NSString> localPart;
   XQueryQName::parseQNameString(name, prefix, localPart);
-  const XQueryContextInternal& context = cast.context._internal();
-  if (prefix->length() == 0) return XQueryQName::qname(name, context.defaultElementNamespace());
-  const Ref<NSString> URI = context.namespaceForPrefix(prefix->view());
+  if (prefix->length() == 0) {
+    return XQueryQName::qname(name, XQueryDefaultElementNamespace(cast.context));
+  }
+  const Ref<NSString> URI = XQueryNamespaceForPrefix(cast.context, prefix->view());
   if (!URI) return nullptr;
   return XQueryQName::qname(name, URI);
 }
@@ -448,7 +449,7 @@ Source sourceOf(const NSObject* object) {
 Value XQueryCastAs(const Value& object, XQueryTypeID type, XQueryContext& forContext) {
   const Source source = sourceOf(object.get());
   if (source == Source::None) {
-    forContext._internal().raise(XQueryErrors::invalidConversion.error());
+    XQueryRaise(forContext, XQueryErrors::invalidConversion.error());
   }
   // A value of the type already is the answer itself; only a notation is made anew.
   if (source != Source::Notation && XQueryObjectTypeID(object.get()) == type) return object;
@@ -461,7 +462,7 @@ Value XQueryCastAs(const Value& object, XQueryTypeID type, XQueryContext& forCon
   Ref<XQueryError> error = XQueryErrors::valueOfAnotherType.error();
   // Of a URI the error is the answer and travels on as an item; no other class does this.
   if (source == Source::AnyURI) return error;
-  forContext._internal().raise(std::move(error));
+  XQueryRaise(forContext, std::move(error));
 }
 
 Value XQueryCastObject(const Value& object, XQueryTypeID asType, XQueryContext& forContext,

@@ -1,7 +1,7 @@
 #include "Types/XQueryDateArithmetic.h"
 
-#include "Context/XQueryContextInternal.h"
 #include "Platform/Dates/GregorianCalendar.h"
+#include "Types/TypesContext.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryDate.h"
 #include "Types/XQueryErrors.h"
@@ -115,7 +115,7 @@ void raiseIfSpecial(const Value& number, XQueryContext& context) {
                              ? numberIn(number).storedDecimal()->isNaN()
                              : !std::isfinite(numberIn(number).doubleValue());
   if (!isSpecial) return;
-  context._internal().raise(XQueryErrors::invalidOperand.error());
+  XQueryRaise(context, XQueryErrors::invalidOperand.error());
 }
 
 // Null when the months do not fit 64 bits.

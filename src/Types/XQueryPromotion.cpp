@@ -1,5 +1,5 @@
 // Bringing a function argument to the kind of value that the function computes with.
-#include "Context/XQueryContextInternal.h"
+#include "Types/TypesContext.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"
@@ -13,7 +13,7 @@ namespace {
 
 [[noreturn]] void raiseWrongKind(const XQueryErrorText<1>& text, const Value& argument,
                                  XQueryContext& context) {
-  context._internal().raise(text.error(XQueryDescription(argument.get())));
+  XQueryRaise(context, text.error(XQueryDescription(argument.get())));
 }
 
 // The list type IDREFS passes for a string here, the other two list types do not.

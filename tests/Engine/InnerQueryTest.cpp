@@ -1,4 +1,4 @@
-#include "Engine/InnerQuery.h"
+#include "Functions/InnerQuery.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>

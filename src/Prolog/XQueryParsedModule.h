@@ -1,8 +1,10 @@
-// What a parse yields: the prolog items in source order, the body and the version.
+// What a parse yields: the prolog items in source order, the body and the version; and how a module
+// that another one imports gets parsed.
 #pragma once
 
 #include "Expr/XQueryExpr.h"
 #include "Prolog/XQueryPrologItems.h"
+#include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
@@ -40,5 +42,13 @@ class XQueryParsedModule : public NSCounted {
   Ref<XQueryExpr> _body;
   Ref<NSString> _version;
 };
+
+struct XQueryParse {
+  Ref<XQueryParsedModule> module;  // null when parsing failed, and for a text that says nothing
+  std::vector<Ref<XQueryError>> errors;
+};
+
+// Parses a text. The parser is in a room above this one and answers there.
+[[nodiscard]] XQueryParse XQueryParseModule(const Ref<NSString>& source);
 
 }  // namespace xquery
