@@ -3,9 +3,8 @@
 //
 // Every argument and result is owned by the current parser's autorelease pool. The grammar decides
 // which class an argument has, so a builder casts without asking; null stands for a part that the
-// query does not have, and for the absent operand that a validate expression is. A line is that of
-// the construct's first token, counted from 0. A list is an array; each ...Add builder appends to
-// the list it is given and answers that same list.
+// query does not have. A line is that of the construct's first token, counted from 0. A list is an
+// array; each ...Add builder appends to the list it is given and answers that same list.
 #pragma once
 
 #include "Expr/Clauses/XQueryFLWOR.h"
@@ -108,7 +107,8 @@ NSObject* XQFunctionCall(NSObject* name, NSObject* args, int64_t line);
 NSObject* XQFunctionArgs(NSObject* expr);
 NSObject* XQFunctionArgsAdd(NSObject* args, NSObject* expr);
 // No expression at all: there is no validation.
-NSObject* XQValidateExpr();
+// Nothing is validated: the empty sequence, whatever stands in the braces.
+NSObject* XQValidateExpr(int64_t line);
 NSObject* XQOperatorLeft(NSObject* expr);
 NSObject* XQOperatorRight(NSObject* expr);
 int XQOperatorType(NSObject* expr);

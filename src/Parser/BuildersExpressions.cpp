@@ -298,8 +298,8 @@ NSObject* XQFunctionArgsAdd(NSObject* args, NSObject* expr) {
   return args;
 }
 
-NSObject* XQValidateExpr() {
-  return nullptr;
+NSObject* XQValidateExpr(int64_t line) {
+  return XQEmptyLiteral(line);
 }
 
 NSObject* XQOperatorLeft(NSObject* expr) {

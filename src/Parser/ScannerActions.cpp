@@ -1,24 +1,13 @@
-#include "Parser/ScannerActions.h"
-
+// What the rules of the scanner do: the names, literals, comments, extensions and errors that are
+// more than one symbol and one next state.
 #include "Parser/ScannerPhrases.h"
 #include "Parser/XQueryParser.h"
+#include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
 
 #include <algorithm>
 
 namespace xquery {
-
-int sXQueryScannerStartState = XQueryStateDEFAULT;
-std::vector<uint8_t> sXQueryScannerStateStack;
-NSMutableString sXQueryScannerStringLiteral;
-int sXQueryScannerStringLiteralToken = 0;
-int sXQueryScannerStringLiteralLineNo = 0;
-std::string sXQueryScannerStringLiteralSource;
-int sXQueryScannerCommentLineNo = 0;
-int sXQueryScannerExtensionLineNo = 0;
-Ref<NSString> sXQueryScannerStringExtensionName;
-NSMutableString sXQueryScannerStringExtensionContent;
-bool sXQueryScannerAtEnd = false;
 
 namespace {
 
@@ -26,31 +15,12 @@ bool isWhiteSpace(char16_t unit) {
   return unit == u' ' || unit == u'\t' || unit == u'\n' || unit == u'\r';
 }
 
-XQSTYPE tokenRecord(int token, int line, std::string_view text) {
-  XQSTYPE record = {};
+XQueryTokenValue tokenRecord(int token, int line, std::string_view text) {
+  XQueryTokenValue record = {};
   record.line = line;
   record.token = token;
   if (sXQueryLogTokenSource) record.source = XQueryParserSting(text);
   return record;
-}
-
-int finishToken(const XQSTYPE& record) {
-  XQlval = record;
-  if (sXQueryLogTokens) XQLexTokenLog(record);
-  return record.token;
-}
-
-int errorToken(const std::string& message, int line) {
-  // The message names the line, so the counter stands there while it is recorded.
-  const int currentLine = XQlineno;
-  XQlineno = line;
-  SetTokenValues(kTokenError, line, XQueryParserSting(message), XQScannerTokenText());
-  XQlineno = currentLine;
-  return kTokenError;
-}
-
-void noteLiteralSource() {
-  if (sXQueryLogTokenSource) sXQueryScannerStringLiteralSource += XQScannerTokenText();
 }
 
 // The target of a processing instruction may not be "xml" in any case.
@@ -109,9 +79,9 @@ constexpr NameRule nameRules[] = {
     {XQueryStatePRAG_NAME, NameShape::QName, 0, XQueryStatePRAG_CONTENT},
 };
 
-XQueryScannedWord scanName(std::string_view rest) {
+XQueryScannedWord scanName(int state, std::string_view rest) {
   const auto* rule = std::find_if(std::begin(nameRules), std::end(nameRules),
-                                  [](const auto& row) { return row.state == sXQueryScannerState; });
+                                  [state](const NameRule& row) { return row.state == state; });
   if (rule == std::end(nameRules)) return {};
   size_t length = 0;
   switch (rule->shape) {
@@ -140,80 +110,124 @@ size_t characterLength(std::string_view text) {
 
 }  // namespace
 
-void XQScannerActionsReset() {
-  sXQueryScannerStateStack = {};
-  sXQueryScannerStringLiteral = {};
-  sXQueryScannerStringLiteralToken = 0;
-  sXQueryScannerStringLiteralLineNo = 0;
-  sXQueryScannerStringLiteralSource = {};
-  sXQueryScannerCommentLineNo = 0;
-  sXQueryScannerExtensionLineNo = 0;
-  sXQueryScannerStringExtensionName = nullptr;
-  sXQueryScannerStringExtensionContent = {};
-  sXQueryScannerAtEnd = false;
+void XQueryScanner::resetActions() {
+  _stateStack = {};
+  _stringLiteral = {};
+  _stringLiteralToken = 0;
+  _stringLiteralLine = 0;
+  _stringLiteralSource = {};
+  _commentLine = 0;
+  _extensionLine = 0;
+  _extensionName = nullptr;
+  _extensionContent = {};
+  _isAtEnd = false;
+  _hasFailed = false;
 }
 
-int SetTokenValues(int token, int line, NSObject* value, std::string_view text) {
-  if (token == kTokenError) XQueryParseError(cast<NSString>(value)->utf8());
-  XQSTYPE record = tokenRecord(token, line, text);
+void XQueryScanner::XQScanStateSet(int state) {
+  if (state != _state) XQLexStateLog("State Set", state);
+  enterState(state);
+}
+
+void XQueryScanner::XQScanStatePush(int state) {
+  XQLexStateLog("State Push", state);
+  _stateStack.push_back(static_cast<uint8_t>(state));
+}
+
+int XQueryScanner::XQScanStatePop() {
+  XQLexStateLog("State Pop");
+  int state = _state;
+  if (!_stateStack.empty()) {
+    state = _stateStack.back();
+    _stateStack.pop_back();
+  }
+  enterState(state);
+  return state;
+}
+
+int XQueryScanner::finishToken(const XQueryTokenValue& record) {
+  *_value = record;
+  if (sXQueryLogTokens) XQLexTokenLog(record);
+  return record.token;
+}
+
+int XQueryScanner::errorToken(const std::string& message, int line) {
+  // The message names the line, so the counter stands there while it is recorded.
+  const int currentLine = _line;
+  _line = line;
+  SetTokenValues(kTokenError, line, XQueryParserSting(message), tokenText());
+  _line = currentLine;
+  return kTokenError;
+}
+
+void XQueryScanner::noteLiteralSource() {
+  if (sXQueryLogTokenSource) _stringLiteralSource += tokenText();
+}
+
+int XQueryScanner::SetTokenValues(int token, int line, NSObject* value, std::string_view text) {
+  if (token == kTokenError) {
+    _hasFailed = true;
+    XQueryParseError(cast<NSString>(value)->utf8());
+  }
+  XQueryTokenValue record = tokenRecord(token, line, text);
   record.value = value;
   return finishToken(record);
 }
 
-int SetTokenValues(int token, int line, char16_t unit, std::string_view text) {
-  XQSTYPE record = tokenRecord(token, line, text);
+int XQueryScanner::SetTokenValues(int token, int line, char16_t unit, std::string_view text) {
+  XQueryTokenValue record = tokenRecord(token, line, text);
   record.unit = unit;
   return finishToken(record);
 }
 
-void XQScannerStringLiteralStart(int tokenCode) {
-  sXQueryScannerStringLiteral.clear();
-  sXQueryScannerStringLiteralSource.clear();
-  sXQueryScannerStringLiteralToken = tokenCode;
-  sXQueryScannerStringLiteralLineNo = XQlineno;
+void XQueryScanner::XQScannerStringLiteralStart(int tokenCode) {
+  _stringLiteral.clear();
+  _stringLiteralSource.clear();
+  _stringLiteralToken = tokenCode;
+  _stringLiteralLine = _line;
 }
 
-int XQSymbol(int token) {
-  return SetTokenValues(token, XQlineno, nullptr, XQScannerTokenText());
+int XQueryScanner::symbol(int token) {
+  return SetTokenValues(token, _line, nullptr, tokenText());
 }
 
-int XQSymbol(int token, int next) {
+int XQueryScanner::symbol(int token, int next) {
   XQScanStateSet(next);
-  return XQSymbol(token);
+  return symbol(token);
 }
 
-int XQSymbol(int token, int push, int next) {
+int XQueryScanner::symbol(int token, int push, int next) {
   XQScanStatePush(push);
-  return XQSymbol(token, next);
+  return symbol(token, next);
 }
 
-int XQSymbolPop(int token) {
+int XQueryScanner::symbolPop(int token) {
   XQScanStatePop();
-  return XQSymbol(token);
+  return symbol(token);
 }
 
-int XQCharacter(int token, char16_t unit) {
-  const int line = XQlineno;
-  XQCountLines();
-  return SetTokenValues(token, line, unit, XQScannerTokenText());
+int XQueryScanner::character(int token, char16_t unit) {
+  const int line = _line;
+  countLines();
+  return SetTokenValues(token, line, unit, tokenText());
 }
 
-int XQNumber(int token) {
+int XQueryScanner::number(int token) {
   XQScanStateSet(XQueryStateOPERATOR);
-  const std::string_view text = XQScannerTokenText();
-  return SetTokenValues(token, XQlineno, XQueryParserSting(text), text);
+  const std::string_view text = tokenText();
+  return SetTokenValues(token, _line, XQueryParserSting(text), text);
 }
 
-int XQOpenBrace(int resume) {
-  return XQSymbol(kTokenCurlyBraceLeft, resume, XQueryStateDEFAULT);
+int XQueryScanner::openBrace(int resume) {
+  return symbol(kTokenCurlyBraceLeft, resume, XQueryStateDEFAULT);
 }
 
-int XQInvalidToken() {
-  const std::string_view text = XQScannerTokenText();
+int XQueryScanner::invalidToken() {
+  const std::string_view text = tokenText();
   std::string message = "invalid token (";
   message += text;
   message += ')';
-  switch (sXQueryScannerState) {
+  switch (_state) {
     case XQueryStateSTRING_LITERAL_QUOTE:
     case XQueryStateSTRING_LITERAL_APOS:
       message += " in string literal";
@@ -230,98 +244,100 @@ int XQInvalidToken() {
     default:
       break;
   }
-  return errorToken(message, XQlineno);
+  return errorToken(message, _line);
 }
 
-int XQEndOfInput() {
-  sXQueryScannerAtEnd = true;
-  switch (sXQueryScannerState) {
+int XQueryScanner::endOfInput() {
+  _isAtEnd = true;
+  switch (_state) {
     case XQueryStateEXPR_COMMENT:
-      return errorToken("comment not terminated ", sXQueryScannerCommentLineNo);
+      return errorToken("comment not terminated ", _commentLine);
     case XQueryStateEXT_CONTENT:
-      return errorToken("extension not terminated ", sXQueryScannerCommentLineNo);
+      return errorToken("extension not terminated ", _commentLine);
+    case XQueryStateEXT_KEY:
+    case XQueryStateEXT_NAME:
+    case XQueryStatePRAG_NAME:
     case XQueryStatePRAG_CONTENT:
-      return errorToken("pragma not terminated ", sXQueryScannerCommentLineNo);
+      return errorToken("pragma not terminated ", _commentLine);
     case XQueryStateSTRING_LITERAL_QUOTE:
     case XQueryStateSTRING_LITERAL_APOS:
-      return errorToken("String not terminated ", sXQueryScannerStringLiteralLineNo);
+      return errorToken("String not terminated ", _stringLiteralLine);
     default:
-      return SetTokenValues(0, XQlineno, nullptr, {});
+      return SetTokenValues(0, _line, nullptr, {});
   }
 }
 
-void XQCountLines() {
-  const std::string_view text = XQScannerTokenText();
-  XQlineno += static_cast<int>(std::count(text.begin(), text.end(), '\n'));
+void XQueryScanner::countLines() {
+  const std::string_view text = tokenText();
+  _line += static_cast<int>(std::count(text.begin(), text.end(), '\n'));
 }
 
-void XQLiteralOpen(int token, char quote, int resume) {
+void XQueryScanner::literalOpen(int token, char quote, int resume) {
   XQScannerStringLiteralStart(token);
   noteLiteralSource();
   XQScanStatePush(resume);
   XQScanStateSet(quote == '"' ? XQueryStateSTRING_LITERAL_QUOTE : XQueryStateSTRING_LITERAL_APOS);
 }
 
-void XQLiteralAppendText() {
-  XQCountLines();
+void XQueryScanner::literalAppendText() {
+  countLines();
   noteLiteralSource();
-  XQAppendUTF8(sXQueryScannerStringLiteral, XQScannerTokenText());
+  XQAppendUTF8(_stringLiteral, tokenText());
 }
 
-void XQLiteralAppendUnit(char16_t unit) {
+void XQueryScanner::literalAppendUnit(char16_t unit) {
   noteLiteralSource();
-  sXQueryScannerStringLiteral.append(unit);
+  _stringLiteral.append(unit);
 }
 
-int XQLiteralClose() {
+int XQueryScanner::literalClose() {
   noteLiteralSource();
   XQScanStatePop();
-  NSString* value = XQueryParserAutoRelease(sXQueryScannerStringLiteral.string());
-  return SetTokenValues(sXQueryScannerStringLiteralToken, sXQueryScannerStringLiteralLineNo, value,
-                        sXQueryScannerStringLiteralSource);
+  NSString* value = XQueryParserAutoRelease(_stringLiteral.string());
+  return SetTokenValues(_stringLiteralToken, _stringLiteralLine, value, _stringLiteralSource);
 }
 
-void XQCommentOpen() {
-  sXQueryScannerCommentLineNo = XQlineno;
-  XQScanStatePush(sXQueryScannerState);
-  XQScanStateSet(XQueryStateEXPR_COMMENT);
+void XQueryScanner::commentOpen(int state) {
+  _commentLine = _line;
+  XQScanStatePush(_state);
+  XQScanStateSet(state);
 }
 
-void XQExtensionOpen(int nameState) {
-  sXQueryScannerExtensionLineNo = XQlineno;
+void XQueryScanner::extensionOpen(int nameState) {
+  _extensionLine = _line;
   XQScanStateSet(nameState);
 }
 
-void XQExtensionAppend() {
-  const char16_t unit = UTF8ToUnicode(XQScannerTokenText());
-  XQCountLines();
+void XQueryScanner::extensionAppend() {
+  const char16_t unit = UTF8ToUnicode(tokenText());
+  countLines();
   // The white space between name and content belongs to neither.
-  const bool first = sXQueryScannerStringExtensionContent.length() == 0;
-  if (!first || !isWhiteSpace(unit)) sXQueryScannerStringExtensionContent.append(unit);
+  const bool first = _extensionContent.length() == 0;
+  if (!first || !isWhiteSpace(unit)) _extensionContent.append(unit);
 }
 
-void XQExtensionClose() {
-  const bool isPragma = sXQueryScannerState == XQueryStatePRAG_CONTENT;
+void XQueryScanner::extensionClose() {
+  const bool isPragma = _state == XQueryStatePRAG_CONTENT;
   // White space before the closing mark belongs to the mark.
-  const NSStringView content = sXQueryScannerStringExtensionContent.view();
+  const NSStringView content = _extensionContent.view();
   uint32_t length = content.length();
   while (length > 0 && isWhiteSpace(content[length - 1])) --length;
   const Ref<NSString> text = NSString::stringWithView(content.substring(0, length));
   // Inside a comment it is only part of the comment.
   if (XQScanStatePop() == XQueryStateEXPR_COMMENT) return;
   const auto report = isPragma ? XQueryParserPragma : XQueryParserExtension;
-  report(sXQueryScannerStringExtensionName, text, sXQueryScannerExtensionLineNo);
+  report(_extensionName, text, _extensionLine);
 }
 
-XQueryScannedWord XQScanWord(std::string_view rest) {
-  const XQueryPhraseMatch match = XQueryMatchPhrase(sXQueryScannerState, rest);
+XQueryScannedWord XQueryScanner::scanWord(std::string_view rest) const {
+  const XQueryPhraseMatch match = XQueryMatchPhrase(_state, rest);
   XQueryScannedWord word;
   if (rest.starts_with(")")) {
     word = {.length = 1, .token = kTokenParenRight, .next = XQueryStateOPERATOR};
-  } else if (sXQueryScannerState == XQueryStateDEFAULT) {
+  } else if (_state == XQueryStateDEFAULT) {
     word = scanOperand(rest);
   } else {
-    word = scanName(rest);
+    word = scanName(_state, rest);
   }
   // A keyword comes before a name of the same length.
   if (match.phrase && match.length >= word.length) {
@@ -336,25 +352,25 @@ XQueryScannedWord XQScanWord(std::string_view rest) {
   return word;
 }
 
-int XQFinishWord(const XQueryScannedWord& word) {
-  if (!word.valid) return XQInvalidToken();
-  const int line = XQlineno;
+int XQueryScanner::finishWord(const XQueryScannedWord& word) {
+  if (!word.valid) return invalidToken();
+  const int line = _line;
   // The value is copied now: the name lies in the scanner's buffer.
   NSObject* value = word.name.empty() ? nullptr : XQueryParserSting(word.name);
-  XQCountLines();
+  countLines();
   if (word.quote != '\0') {
-    XQLiteralOpen(word.token, word.quote, word.push);
+    literalOpen(word.token, word.quote, word.push);
     return 0;
   }
   if (word.token == 0) {
-    sXQueryScannerStringExtensionName = Ref<NSString>(cast<NSString>(value));
-    sXQueryScannerStringExtensionContent.clear();
+    _extensionName = Ref<NSString>(cast<NSString>(value));
+    _extensionContent.clear();
     XQScanStateSet(word.next);
     return 0;
   }
   if (word.push >= 0) XQScanStatePush(word.push);
   XQScanStateSet(word.next);
-  return SetTokenValues(word.token, line, value, XQScannerTokenText());
+  return SetTokenValues(word.token, line, value, tokenText());
 }
 
 }  // namespace xquery

@@ -2,6 +2,7 @@
 
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryString.h"
 
 #include <algorithm>
@@ -179,10 +180,6 @@ const Index& phrasesOfState(int state) {
   return index[static_cast<size_t>(state)];
 }
 
-bool isWhiteSpace(char character) {
-  return character == ' ' || character == '\t' || character == '\n' || character == '\r';
-}
-
 bool isLetter(char character) {
   return (character >= 'a' && character <= 'z') || (character >= 'A' && character <= 'Z');
 }
@@ -223,7 +220,9 @@ size_t pragmaLength(std::string_view text) {
 // Length of the comment that starts with "(:"; 0 when it does not end.
 size_t commentLength(std::string_view text) {
   size_t depth = 0;
+  WorkPacer pacer;
   for (size_t at = 0; at + 1 < text.size();) {
+    pacer.turn();
     if (text[at] == '(' && text[at + 1] == ':') {
       if (depth > 0 && text.substr(at, 3) == "(::") {
         at += pragmaLength(text.substr(at));
@@ -305,7 +304,11 @@ XQueryPhraseMatch XQueryMatchPhrase(int state, std::string_view text) {
 size_t XQueryNCNameLength(std::string_view text) {
   size_t length = nameCharacterLength(text, true);
   if (length == 0) return 0;
-  while (const size_t next = nameCharacterLength(text.substr(length), false)) length += next;
+  WorkPacer pacer;
+  while (const size_t next = nameCharacterLength(text.substr(length), false)) {
+    pacer.turn();
+    length += next;
+  }
   return length;
 }
 
@@ -319,7 +322,9 @@ size_t XQueryQNameLength(std::string_view text) {
 size_t XQueryNameLength(std::string_view text) {
   size_t length = XQueryNCNameLength(text);
   if (length == 0) return 0;
+  WorkPacer pacer;
   while (length < text.size()) {
+    pacer.turn();
     const size_t next = text[length] == ':' ? 1 : nameCharacterLength(text.substr(length), false);
     if (next == 0) break;
     length += next;
@@ -330,8 +335,8 @@ size_t XQueryNameLength(std::string_view text) {
 size_t XQuerySkipLength(std::string_view text) {
   size_t at = 0;
   while (at < text.size()) {
-    if (isWhiteSpace(text[at])) {
-      ++at;
+    if (const size_t run = XQWhiteSpaceRun(text.substr(at))) {
+      at += run;
     } else if (text.substr(at, 2) == "(:" && text.substr(at, 3) != "(::") {
       const size_t length = commentLength(text.substr(at));
       if (length == 0) return at;

@@ -1,4 +1,7 @@
 #include "Parser/XQueryScanner.h"
+#include "Platform/Base/WorkMeter.h"
+
+#include <algorithm>
 
 namespace xquery {
 namespace {
@@ -16,6 +19,26 @@ char32_t decode(std::string_view bytes, size_t& length) {
   return length = 4, (first & 0x07U) << 18 | tail(1) << 12 | tail(2) << 6 | tail(3);
 }
 
+constexpr size_t longestRun = size_t{64} * 1024;
+constexpr size_t bytesPerStep = 4096;
+
+bool isWhiteSpace(char character) {
+  return character == ' ' || character == '\t' || character == '\n' || character == '\r';
+}
+
+// U+FFFE and U+FFFF, which are no characters.
+bool isNonCharacter(std::string_view text) {
+  return text.substr(0, 2) == "\xEF\xBF" && text.size() > 2 && (text[2] | 1) == '\xBF';
+}
+
+bool isControl(char character) {
+  return static_cast<unsigned char>(character) < 0x20 && !isWhiteSpace(character);
+}
+
+bool isInsideCharacter(char byte) {
+  return (static_cast<unsigned char>(byte) & 0xC0) == 0x80;
+}
+
 unsigned hexDigit(char character, bool& isDigit) {
   isDigit = true;
   if (character >= '0' && character <= '9') return static_cast<unsigned>(character - '0');
@@ -26,6 +49,34 @@ unsigned hexDigit(char character, bool& isDigit) {
 }
 
 }  // namespace
+
+size_t XQWhiteSpaceRun(std::string_view text) {
+  const std::string_view piece = text.substr(0, longestRun);
+  const auto end = std::find_if_not(piece.begin(), piece.end(), isWhiteSpace);
+  const auto length = static_cast<size_t>(end - piece.begin());
+  checkWork(length / bytesPerStep);
+  return length;
+}
+
+size_t XQWhiteSpaceLength(std::string_view text) {
+  size_t length = 0;
+  while (const size_t run = XQWhiteSpaceRun(text.substr(length))) length += run;
+  return length;
+}
+
+size_t XQTextRun(std::string_view text, char delimiter, char otherDelimiter) {
+  const size_t most = std::min(text.size(), longestRun);
+  size_t length = 0;
+  for (; length < most; ++length) {
+    const char byte = text[length];
+    if (byte == delimiter || byte == otherDelimiter || isControl(byte)) break;
+    if (byte == '\xEF' && isNonCharacter(text.substr(length, 3))) break;
+  }
+  // A piece ends with a whole character.
+  while (length < text.size() && isInsideCharacter(text[length])) --length;
+  checkWork(length / bytesPerStep);
+  return length;
+}
 
 char16_t CharRefToUnicode(std::string_view text) {
   constexpr uint32_t tooLarge = 0x10000;

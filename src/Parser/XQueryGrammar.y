@@ -10,6 +10,9 @@
    The order of the productions is part of the interface: their numbers are what a trace prints. */
 
 %define api.prefix {XQ}
+%define api.pure full
+%parse-param {xquery::XQueryParser& parser}
+%lex-param {xquery::XQueryParser& parser}
 %define api.value.type {xquery::XQueryTokenValue}
 %define parse.trace
 %token-table
@@ -17,20 +20,24 @@
 
 %code requires {
 #include "Parser/XQueryTokenValue.h"
+
+namespace xquery {
+class XQueryParser;
+}
 }
 
 %code top {
 #include "Parser/XQueryParser.h"
 
-/* The parser's stacks belong to the current parser: an exception that passes through the parser
-   leaks nothing. */
+/* The parser's stacks belong to the parse: an exception that passes through the parser leaks
+   nothing. */
 #define YYMALLOC xquery::XQueryParserAllocate
 #define YYFREE(block) static_cast<void>(block)
 
-/* What bounds the nesting of a query: the symbols that may wait on the parser's stack. One open
-   parenthesis takes one, an open direct element four, a nested conditional seven. A query that
-   needs more ends with the message "parser stack overflow". */
-#define YYMAXDEPTH 10000
+/* The nesting of a query is bounded by the memory for the symbols that wait on the stack, of which
+   each took a byte of the query at least. Where there is none left, the query ends with the message
+   "parser stack overflow". */
+#define YYMAXDEPTH (1 << 30)
 }
 
 %code {
@@ -40,8 +47,10 @@
 
 using namespace xquery;
 
-/* The generator's two messages in the words that users of the engine know. */
-static void XQReport(std::string_view message) {
+/* The generator's two messages in the words that users of the engine know. What the scanner has
+   complained of is not complained of again. */
+static void XQReport(XQueryParser& parser, std::string_view message) {
+  if (parser.scanner().hasFailed()) return;
   if (message == "syntax error") message = "parse error";
   if (message == "memory exhausted") message = "parser stack overflow";
   xquery::XQerror(message.data());
@@ -51,6 +60,8 @@ static void XQReport(std::string_view message) {
 #undef yyerror
 #define yyerror XQReport
 #define XQerror XQtokentype::XQerror
+
+static int XQlex(XQSTYPE* value, XQueryParser& parser) { return parser.scanner().XQlex(*value); }
 
 static XQSTYPE XQValue(int32_t line, NSObject* value) {
   XQSTYPE result = {};
@@ -251,9 +262,9 @@ static XQSTYPE XQUnit(int32_t line, char16_t unit) {
 
 XQuery:
     Module
-      { yyparse_result = $1.value; }
+      { parser.setResult($1.value); }
   | %empty
-      { yyparse_result = nullptr; }
+      { parser.setResult(nullptr); }
   ;
 
 Module:
@@ -335,37 +346,37 @@ NonSetters2:
 Setter:
     XMLSpaceDecl kTokenSemicolon
       {
-        XQueryParserSetSetterFlag(XQuerySetterXMLSpace, $1.line);
+        parser.XQueryParserSetSetterFlag(XQuerySetterXMLSpace, $1.line);
         $$ = $1;
       }
   | DefaultCollationDecl kTokenSemicolon
       {
-        XQueryParserSetSetterFlag(XQuerySetterDefaultCollation, $1.line);
+        parser.XQueryParserSetSetterFlag(XQuerySetterDefaultCollation, $1.line);
         $$ = $1;
       }
   | BaseURIDecl kTokenSemicolon
       {
-        XQueryParserSetSetterFlag(XQuerySetterBaseURI, $1.line);
+        parser.XQueryParserSetSetterFlag(XQuerySetterBaseURI, $1.line);
         $$ = $1;
       }
   | ConstructionDecl kTokenSemicolon
       {
-        XQueryParserSetSetterFlag(XQuerySetterConstruction, $1.line);
+        parser.XQueryParserSetSetterFlag(XQuerySetterConstruction, $1.line);
         $$ = $1;
       }
   | DefaultOrderingDecl kTokenSemicolon
       {
-        XQueryParserSetSetterFlag(XQuerySetterOrdering, $1.line);
+        parser.XQueryParserSetSetterFlag(XQuerySetterOrdering, $1.line);
         $$ = $1;
       }
   | EmptyOrderingDecl kTokenSemicolon
       {
-        XQueryParserSetSetterFlag(XQuerySetterEmptyOrdering, $1.line);
+        parser.XQueryParserSetSetterFlag(XQuerySetterEmptyOrdering, $1.line);
         $$ = $1;
       }
   | InheritNamespacesDecl kTokenSemicolon
       {
-        XQueryParserSetSetterFlag(XQuerySetterInheritNamespaces, $1.line);
+        parser.XQueryParserSetSetterFlag(XQuerySetterInheritNamespaces, $1.line);
         $$ = $1;
       }
   ;
@@ -1076,11 +1087,11 @@ Predicate:
 
 ValidateExpr:
     kTokenValidateCurlyBraceLeft Expr kTokenCurlyBraceRight
-      { $$ = XQValue($1.line, XQValidateExpr()); }
+      { $$ = XQValue($1.line, XQValidateExpr($1.line)); }
   | kTokenValidateModeLax Expr kTokenCurlyBraceRight
-      { $$ = XQValue($1.line, XQValidateExpr()); }
+      { $$ = XQValue($1.line, XQValidateExpr($1.line)); }
   | kTokenValidateModeStrict Expr kTokenCurlyBraceRight
-      { $$ = XQValue($1.line, XQValidateExpr()); }
+      { $$ = XQValue($1.line, XQValidateExpr($1.line)); }
   ;
 
 Constructor:

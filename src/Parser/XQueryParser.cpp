@@ -7,56 +7,19 @@
 #include "Types/XQueryErrors.h"
 
 #include <algorithm>
-#include <chrono>
-#include <climits>
-#include <condition_variable>
 #include <cstring>
 #include <exception>
-#include <mutex>
 #include <new>
+
+// What bison makes of the grammar.
+int XQparse(xquery::XQueryParser& parser);
 
 namespace xquery {
 namespace {
 
-// The process-wide lock. Whoever waits for it can be ended. It is made of a mutex and a condition
-// because ThreadSanitizer does not see every way in which the library locks a timed mutex.
-class ParserLock {
- public:
-  void lock() {
-    constexpr std::chrono::milliseconds betweenLooks(20);
-    std::unique_lock guard(_mutex);
-    while (_isTaken) {
-      _released.wait_for(guard, betweenLooks);
-      if (!_isTaken) break;
-      guard.unlock();
-      lookAtWork();
-      guard.lock();
-    }
-    _isTaken = true;
-  }
-  void unlock() {
-    {
-      const std::lock_guard guard(_mutex);
-      _isTaken = false;
-    }
-    _released.notify_one();
-  }
-
- private:
-  std::mutex _mutex;
-  std::condition_variable _released;
-  bool _isTaken = false;
-};
-
-ParserLock& parserLock() {
-  // Never destroyed: queries may be compiled by destructors that run at exit.
-  alignas(ParserLock) static unsigned char storage[sizeof(ParserLock)];
-  static ParserLock* const sXQueryParserLock = ::new (storage) ParserLock;
-  return *sXQueryParserLock;
-}
-
-XQueryParser* sXQueryParserCurrent = nullptr;
-unsigned sXQueryParserSetterFlags = 0;
+// Reached with one instruction: every builder asks for it.
+constinit thread_local XQueryParser* sXQueryParserCurrent
+    __attribute__((tls_model("initial-exec"))) = nullptr;
 
 struct SetterError {
   unsigned flag;
@@ -73,6 +36,10 @@ constexpr SetterError setterErrors[] = {
     {XQuerySetterInheritNamespaces, XQueryErrors::secondInheritNamespaces},
 };
 
+int currentLine() {
+  return sXQueryParserCurrent->scanner().line();
+}
+
 void logText(const Ref<NSString>& text) {
   if (XQueryLogEnabled()) NSLog(text->utf8());
 }
@@ -88,31 +55,45 @@ template <size_t places, class... Parts>
 void logAndRecord(const XQueryErrorText<places>& row, const Parts&... parts) {
   const Ref<NSString> text = row.message(parts...);
   logText(text);
-  sXQueryParserCurrent->setError(XQueryError::error(row.number, text, XQlineno));
+  sXQueryParserCurrent->setError(XQueryError::error(row.number, text, currentLine()));
 }
 
 Ref<NSString> currentSourceLine() {
-  return sXQueryParserCurrent->sourceLine(XQlineno);
+  return sXQueryParserCurrent->sourceLine(currentLine());
+}
+
+// A carriage return, with the line feed behind it if there is one, is one line feed.
+template <class Bytes>
+void appendWithLineFeeds(Bytes& out, std::string_view bytes, bool& isAfterReturn) {
+  if (isAfterReturn && bytes.starts_with('\n')) bytes.remove_prefix(1);
+  isAfterReturn = false;
+  while (!bytes.empty()) {
+    const size_t length = std::min(bytes.find('\r'), bytes.size());
+    out.insert(out.end(), bytes.begin(), bytes.begin() + static_cast<ptrdiff_t>(length));
+    bytes.remove_prefix(length);
+    if (bytes.empty()) return;
+    out.push_back('\n');
+    bytes.remove_prefix(1);
+    isAfterReturn = bytes.empty();
+    if (bytes.starts_with('\n')) bytes.remove_prefix(1);
+  }
 }
 
 }  // namespace
 
-NSObject* yyparse_result = nullptr;
-
-// An evaluation that compiles a query may be ended while it waits for another thread's parse.
-XQueryParser::Session::Session(XQueryParser& parser) : _parser(parser) {
-  parserLock().lock();
+XQueryParser::Session::Session(XQueryParser& parser)
+    : _parser(parser), _around(sXQueryParserCurrent) {
+  parser._scanner = std::make_unique<XQueryScanner>(parser);
+  parser._setterFlags = 0;
   sXQueryParserCurrent = &parser;
-  sXQueryParserSetterFlags = 0;
 }
 
 XQueryParser::Session::~Session() {
-  XQueryScannerEnd();
-  yyparse_result = nullptr;
-  _parser._pool.clear();
-  _parser._blocks.clear();
-  sXQueryParserCurrent = nullptr;
-  parserLock().unlock();
+  _parser._scanner = nullptr;
+  _parser._result = nullptr;
+  _parser._pool = {};
+  _parser._blocks = {};
+  sXQueryParserCurrent = _around;
 }
 
 Ref<XQueryParser> XQueryParser::unparsedParserWithSource(Ref<NSString> source) {
@@ -132,10 +113,7 @@ XQueryParser* XQueryParser::currentParser() {
 void XQueryParser::parse() {
   const Session session(*this);
   try {
-    XQueryScannerInit(XQueryStateDEFAULT);
-    yyparse_result = nullptr;
-    // A failed run may leave what an unfinished rule had built.
-    if (XQparse() == 0) _parsedModule = cast<XQueryParsedModule>(yyparse_result);
+    runGrammar();
   } catch (const NSException&) {
     // The scanner's own error was recorded before it was raised; any other ends the evaluation that
     // the parse is part of.
@@ -143,6 +121,8 @@ void XQueryParser::parse() {
     if (_errors.empty()) throw;
   } catch (const std::bad_alloc&) {
     _parsedModule = nullptr;
+    // Where it was a ceiling that refused the memory, this ends the evaluation.
+    lookAtWork();
     setError(XQueryErrors::outOfMemory.error());
   } catch (const std::exception& failure) {
     _parsedModule = nullptr;
@@ -150,46 +130,79 @@ void XQueryParser::parse() {
   }
 }
 
-Ref<NSString> XQueryParser::sourceLine(int64_t index) {
-  if (_sourceLines.empty()) {
-    const NSStringView text = _source->view();
-    for (uint32_t start = 0;;) {
-      const uint32_t end = text.find(u'\n', start);
-      if (end == NSStringView::notFound) {
-        _sourceLines.push_back(NSString::stringWithView(text.substring(start)));
-        break;
-      }
-      _sourceLines.push_back(NSString::stringWithView(text.substring(start, end - start)));
-      start = end + 1;
-    }
+// A failed run may leave what an unfinished rule had built.
+void XQueryParser::runGrammar() {
+  _scanner->XQueryScannerInit(XQueryStateDEFAULT);
+  if (XQparse(*this) == 0) _parsedModule = cast<XQueryParsedModule>(_result);
+}
+
+// The source without a byte order mark at its start.
+NSStringView XQueryParser::text() const {
+  constexpr char16_t byteOrderMark = 0xFEFF;
+  const NSStringView text = _source->view();
+  return text.length() > 0 && text[0] == byteOrderMark ? text.substring(1) : text;
+}
+
+Ref<NSString> XQueryParser::sourceLine(int64_t index) const {
+  const NSStringView text = this->text();
+  WorkPacer pacer;
+  uint32_t start = 0;
+  for (uint32_t at = 0; index >= 0; ++at) {
+    pacer.turn();
+    const bool isAtEnd = at >= text.length();
+    const char16_t unit = isAtEnd ? u'\n' : text[at];
+    if (unit != u'\n' && unit != u'\r') continue;
+    if (index == 0) return NSString::stringWithView(text.substring(start, at - start));
+    if (isAtEnd) break;
+    if (unit == u'\r' && at + 1 < text.length() && text[at + 1] == u'\n') ++at;
+    start = at + 1;
+    --index;
   }
-  if (index < 0 || static_cast<uint64_t>(index) >= _sourceLines.size()) return NSString::empty();
-  return _sourceLines[static_cast<size_t>(index)];
+  return NSString::empty();
+}
+
+void XQueryParser::makeUTF8String() {
+  constexpr uint32_t unitsAtATime = 64 * 1024;
+  constexpr uint32_t unitsPerStep = 4096;
+  const NSStringView text = this->text();
+  _utf8String.reserve(text.length());
+  std::string bytes;
+  bool isAfterReturn = false;
+  for (uint32_t start = 0, end = 0; start < text.length(); start = end) {
+    checkWork(unitsAtATime / unitsPerStep);
+    end = std::min(text.length() - start, unitsAtATime) + start;
+    // Both halves of a pair belong to one character.
+    if (end < text.length() && (text[end - 1] & 0xFC00) == 0xD800) ++end;
+    bytes.clear();
+    text.substring(start, end - start).appendUTF8To(bytes);
+    appendWithLineFeeds(_utf8String, bytes, isAfterReturn);
+  }
+  _length = _utf8String.size();
+  _hasUTF8String = true;
 }
 
 size_t XQueryParser::remainingBytes() {
-  if (!_hasUTF8String) {
-    _utf8String = _source->utf8();
-    _length = _utf8String.size();
-    _hasUTF8String = true;
-  }
+  if (!_hasUTF8String) makeUTF8String();
   return _length - _position;
 }
 
 size_t XQueryParser::readChars(size_t maxBytes, char* toBuffer) {
   const size_t count = std::min(maxBytes, remainingBytes());
-  std::memcpy(toBuffer, _utf8String.data() + _position, count);
+  if (count > 0) std::memcpy(toBuffer, _utf8String.data() + _position, count);
   _position += count;
+  // What was handed out is not kept twice.
+  if (_position == _length) _utf8String = {};
   return count;
 }
 
 void* XQueryParser::allocate(size_t size) {
-  _blocks.push_back(std::make_unique_for_overwrite<char[]>(size));
-  return _blocks.back().get();
-}
-
-size_t XQueryParserReadChars(char* buffer, size_t maxBytes) {
-  return sXQueryParserCurrent->readChars(maxBytes, buffer);
+  try {
+    return _blocks.emplace_back(size).data();
+  } catch (const std::bad_alloc&) {
+    // A ceiling ends more than the parse.
+    lookAtWork();
+    return nullptr;
+  }
 }
 
 NSString* XQueryParserSting(std::string_view bytes) {
@@ -201,7 +214,8 @@ void* XQueryParserAllocate(size_t size) {
 }
 
 void XQerror(const char* message) {
-  logAndRecord(XQueryErrors::invalidToken, message, XQScannerTokenText(), currentSourceLine());
+  logAndRecord(XQueryErrors::invalidToken, message, sXQueryParserCurrent->scanner().tokenText(),
+               currentSourceLine());
 }
 
 void XQueryParseError(std::string_view message) {
@@ -219,13 +233,11 @@ void XQueryParserExtension(const Ref<NSString>& name, const Ref<NSString>& conte
 
 void XQueryParserPragma(const Ref<NSString>&, const Ref<NSString>&, int64_t) {}
 
-void XQueryParserSetSetterFlag(unsigned flag, int64_t line) {
+void XQueryParser::XQueryParserSetSetterFlag(unsigned flag, int64_t line) {
   for (const SetterError& row : setterErrors) {
     if (row.flag != flag) continue;
-    if (sXQueryParserSetterFlags & flag) {
-      sXQueryParserCurrent->setError(row.text.errorAtLine(line));
-    }
-    sXQueryParserSetterFlags |= flag;
+    if (_setterFlags & flag) setError(row.text.errorAtLine(line));
+    _setterFlags |= flag;
     return;
   }
 }

@@ -1,12 +1,12 @@
 // The parser driver: turns the text of one query or library module into an XQueryParsedModule and a
 // list of errors.
 //
-// The generated scanner and parser keep their state in globals. One process-wide lock, held for the
-// whole of each parse, makes them safe to use from several threads; while it is held, the parser
-// that holds it is the current one, through which the scanner reads its input, reports errors and
-// leaves its objects in an autorelease pool.
+// All that a parse works on belongs to its parser, so any number of threads may parse at once.
+// While a parser parses, it is the current one of its thread: the builders of the grammar leave
+// their objects in its autorelease pool.
 #pragma once
 
+#include "Parser/XQueryScanner.h"
 #include "Prolog/XQueryParsedModule.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
@@ -42,21 +42,30 @@ class XQueryParser : public NSCounted {
   const Ref<XQueryParsedModule>& parsedModule() const { return _parsedModule; }
   const std::vector<Ref<XQueryError>>& errors() const { return _errors; }
   const Ref<NSString>& source() const { return _source; }
-  // The line of the source, counted from 0 and split at "\n"; the empty string outside.
-  Ref<NSString> sourceLine(int64_t index);
+  // The line of the source, counted from 0; the empty string outside.
+  Ref<NSString> sourceLine(int64_t index) const;
   void setError(Ref<XQueryError> error) { _errors.push_back(std::move(error)); }
+  // That of this thread; null outside a parse.
   static XQueryParser* currentParser();
 
-  // Copies the next bytes of the source's UTF-8 form; answers how many, 0 at the end.
+  // Copies the next bytes of the source's UTF-8 form, in which every line ends with a line feed and
+  // no byte order mark stands at the start; answers how many, 0 at the end.
   size_t readChars(size_t maxBytes, char* toBuffer);
   // Bytes that readChars has still to hand out.
   size_t remainingBytes();
 
+  // --- while it parses ---------------------------------------------------------------------------
+  XQueryScanner& scanner() { return *_scanner; }
+  // The value of the grammar's start symbol: a module, or null for a query of nothing.
+  void setResult(NSObject* module) { _result = module; }
+  // The second declaration of one kind is an error at its line; an unknown flag is ignored.
+  void XQueryParserSetSetterFlag(unsigned flag, int64_t line);
   // Keeps the object alive until the parse ends.
   void autorelease(Value object) { _pool.push_back(std::move(object)); }
+  // Memory that lives as long; null when there is none.
   void* allocate(size_t size);
 
-  // Makes a parser the current one and the caller the owner of the process-wide lock.
+  // Makes a parser the current one of its thread and gives it a scanner.
   class Session {
    public:
     explicit Session(XQueryParser& parser);
@@ -66,6 +75,7 @@ class XQueryParser : public NSCounted {
 
    private:
     XQueryParser& _parser;
+    XQueryParser* const _around;  // the one that was current before
   };
   // A parser that has not parsed, for driving the scanner alone.
   [[nodiscard]] static Ref<XQueryParser> unparsedParserWithSource(Ref<NSString> source);
@@ -77,26 +87,30 @@ class XQueryParser : public NSCounted {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  template <class T>
+  using Counted = std::vector<T, ValueAllocator<T>>;
+
   void parse();
+  void runGrammar();
+  void makeUTF8String();
+  NSStringView text() const;
 
   std::vector<Ref<XQueryError>> _errors;
   Ref<NSString> _source;
-  std::vector<Ref<NSString>> _sourceLines;
-  std::string _utf8String;
+  Counted<char> _utf8String;
   Ref<XQueryParsedModule> _parsedModule;
   size_t _length = 0;
   size_t _position = 0;
   bool _hasUTF8String = false;
-  std::vector<Value> _pool;
-  std::vector<std::unique_ptr<char[]>> _blocks;
+  unsigned _setterFlags = 0;
+  NSObject* _result = nullptr;  // owned by the pool
+  std::unique_ptr<XQueryScanner> _scanner;
+  Counted<Value> _pool;
+  std::vector<Counted<char>> _blocks;
 };
-
-// The value of the last grammar run; owned by the current parser's pool.
-extern NSObject* yyparse_result;
 
 // --- what the scanner and the grammar call; each works on the current parser ---------------------
 
-size_t XQueryParserReadChars(char* buffer, size_t maxBytes);
 // A string owned by the parser's pool. The name lacks its "r".
 NSString* XQueryParserSting(std::string_view bytes);
 template <class T>
@@ -105,7 +119,7 @@ T* XQueryParserAutoRelease(Ref<T> object) {
   if (result) XQueryParser::currentParser()->autorelease(Value(std::move(object)));
   return result;
 }
-// Memory that lives as long as the current parser.
+// Memory that lives as long as the parse; null when there is none.
 void* XQueryParserAllocate(size_t size);
 
 // A syntax error: error 3 with the current token, the current line and its text.
@@ -118,7 +132,5 @@ void XQueryParseError(std::string_view message);
 // Every extension is rejected (error 14), every pragma accepted and ignored.
 void XQueryParserExtension(const Ref<NSString>& name, const Ref<NSString>& content, int64_t line);
 void XQueryParserPragma(const Ref<NSString>& name, const Ref<NSString>& content, int64_t line);
-// The second declaration of one kind is an error at its line; an unknown flag is ignored.
-void XQueryParserSetSetterFlag(unsigned flag, int64_t line);
 
 }  // namespace xquery

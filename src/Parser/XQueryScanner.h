@@ -4,22 +4,22 @@
 // comments, so the scanner is a machine of 30 lexical states with a stack of return states. Every
 // rule runs in its own states only, and the action of each token names the next state.
 //
-// All state is global. It is valid only while a parser is the current one.
+// A scanner belongs to one parse and holds all of its state, that of the generated code included,
+// so any number of threads may scan at once.
 #pragma once
 
 #include "Parser/XQueryTokenValue.h"
 #include "xquery/String.h"
 
+#include <cstddef>
 #include <cstdint>
+#include <string>
 #include <string_view>
-
-// The current line, counted from 0.
-extern int XQlineno;
-
-// The next token code, 0 at the end of the input; fills XQlval.
-int XQlex();
+#include <vector>
 
 namespace xquery {
+
+class XQueryParser;
 
 // In the order of their numbers. The formatter does not know a list when it sees one.
 // clang-format off
@@ -41,28 +41,122 @@ enum XQueryScannerState : int {
       XQueryStateCount
 };
 
-// Clears everything; the first character is scanned in `startState`. The input is that of the
-// current parser.
-void XQueryScannerInit(int startState);
-// Gives the buffers back.
-void XQueryScannerEnd();
+// What stands at the start of the rest of the input, where a name or a ")" begins.
+struct XQueryScannedWord {
+  size_t length = 0;
+  int token = 0;               // 0 for what is no token of its own
+  std::string_view name = {};  // the token's value
+  int push = -1;
+  int next = -1;
+  char quote = '\0';  // opens a string literal that will be the token
+  bool valid = true;
+};
 
-extern int sXQueryScannerState;
-void XQScanStateSet(int state);
-// Saves a state to return to.
-void XQScanStatePush(int state);
-// Returns to the state saved last and answers it. With nothing saved the state stays.
-int XQScanStatePop();
-size_t XQScanStateDepth();
+class XQueryScanner {
+ public:
+  // The parser gives the input and takes the errors.
+  explicit XQueryScanner(XQueryParser& parser) : _parser(parser) {}
+  ~XQueryScanner() { end(); }
+  XQueryScanner(const XQueryScanner&) = delete;
+  XQueryScanner& operator=(const XQueryScanner&) = delete;
 
-// Begins a string literal that closes as `tokenCode`.
-void XQScannerStringLiteralStart(int tokenCode);
-// Fill XQlval and answer the token. For the error token the value is the message, which is recorded
-// at once.
-int SetTokenValues(int token, int line, NSObject* value, std::string_view text);
-int SetTokenValues(int token, int line, char16_t unit, std::string_view text);
-// The text of the current token; empty at the end of the input.
-std::string_view XQScannerTokenText();
+  // Takes the parser's whole input; the first character is scanned in `startState`.
+  void XQueryScannerInit(int startState);
+  // The next token code, 0 at the end of the input; fills the value.
+  int XQlex(XQueryTokenValue& value);
+
+  // The current line, counted from 0.
+  int line() const { return _line; }
+  // The text of the current token; empty at the end of the input.
+  std::string_view tokenText() const;
+  // Whether it came upon what is no token.
+  bool hasFailed() const { return _hasFailed; }
+  int state() const { return _state; }
+  // The return states; the last one is the top.
+  const std::vector<uint8_t>& stateStack() const { return _stateStack; }
+
+  void XQScanStateSet(int state);
+  // Saves a state to return to.
+  void XQScanStatePush(int state);
+  // Returns to the state saved last and answers it. With nothing saved the state stays.
+  int XQScanStatePop();
+  // Begins a string literal that closes as `tokenCode`.
+  void XQScannerStringLiteralStart(int tokenCode);
+  // Fill the value of the token and answer it. The value of the error token is the message, which
+  // is recorded at once.
+  int SetTokenValues(int token, int line, NSObject* value, std::string_view text);
+  int SetTokenValues(int token, int line, char16_t unit, std::string_view text);
+
+ private:
+  // The generated code, and what its rules do: the names, literals, comments, extensions and errors
+  // that are more than one symbol and one next state (ScannerActions.cpp). What answers an int
+  // answers the token.
+  friend class XQueryScannerRules;
+
+  int startState() const { return _startState; }
+  int symbol(int token);
+  int symbol(int token, int next);
+  int symbol(int token, int push, int next);
+  int symbolPop(int token);
+  int character(int token, char16_t unit);
+  int number(int token);
+  int openBrace(int resume);
+  int invalidToken();
+  int endOfInput();
+  // Advances the line counter by the line ends in the current token.
+  void countLines();
+  void literalOpen(int token, char quote, int resume);
+  void literalAppendText();
+  void literalAppendUnit(char16_t unit);
+  int literalClose();
+  // Of a comment, or of a pragma or extension.
+  void commentOpen(int state);
+  void extensionOpen(int nameState);
+  void extensionAppend();
+  void extensionClose();
+  XQueryScannedWord scanWord(std::string_view rest) const;
+  // To be called when the current token is the word; 0 when there is no token to return.
+  int finishWord(const XQueryScannedWord& word);
+
+  int finishToken(const XQueryTokenValue& record);
+  int errorToken(const std::string& message, int line);
+  void noteLiteralSource();
+  void enterState(int state);
+  void resetActions();
+  void end();
+
+  XQueryParser& _parser;
+  void* _generated = nullptr;  // what the generated code knows of its input
+  char* _input = nullptr;
+  size_t _inputBytes = 0;  // what the input takes, with its end marks
+  XQueryTokenValue* _value = nullptr;
+  int _line = 0;
+  int _state = XQueryStateINITIAL;
+  int _startState = XQueryStateDEFAULT;
+  std::vector<uint8_t> _stateStack;
+  bool _isAtEnd = false;
+  bool _hasFailed = false;
+  // The literal being read, and where it began.
+  NSMutableString _stringLiteral;
+  int _stringLiteralToken = 0;
+  int _stringLiteralLine = 0;
+  std::string _stringLiteralSource;  // only while token sources are logged
+  // Lines of the last "(:" and of the last "pragma" or "extension".
+  int _commentLine = 0;
+  int _extensionLine = 0;
+  Ref<NSString> _extensionName;
+  NSMutableString _extensionContent;
+};
+
+// --- runs of text --------------------------------------------------------------------------------
+
+// Bytes of the white space at the start of the text, and of the characters that XML allows up to
+// one of two delimiters. A long run is answered in pieces, so that whoever works on it can be
+// ended.
+size_t XQWhiteSpaceRun(std::string_view text);
+size_t XQTextRun(std::string_view text, char delimiter, char otherDelimiter);
+// All of the white space.
+size_t XQWhiteSpaceLength(std::string_view text);
 
 // --- character conversions -----------------------------------------------------------------------
 

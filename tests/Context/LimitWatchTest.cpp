@@ -1,7 +1,6 @@
 // Evaluations inside an evaluation: a client of the host begins them on the same thread.
 #include "Context/LimitWatch.h"
 #include "Engine/LimitsTestSupport.h"
-#include "Parser/XQueryParser.h"
 #include "Platform/Loading/HTTPServer.h"
 
 #include <gtest/gtest.h>
@@ -147,29 +146,6 @@ TEST_F(LimitWatch, CompilingInsideAnEvaluationEndsItAtTheLimit) {
                            limitstest::mostLate);
   }
   EXPECT_EQ(evaluate(*XQueryContext::xqueryContext(), "1 + 1").result, "2");
-}
-
-TEST_F(LimitWatch, WaitingForTheParseOfAnotherThreadEndsAtTheLimit) {
-  std::atomic<bool> isHeld = false;
-  std::atomic<bool> isOver = false;
-  std::thread other([&] {
-    const auto parser = XQueryParser::unparsedParserWithSource(NSString::empty());
-    const XQueryParser::Session session(*parser);
-    isHeld = true;
-    while (!isOver) std::this_thread::sleep_for(milliseconds(1));
-  });
-  while (!isHeld) std::this_thread::yield();
-  outerLimits.duration = milliseconds(30);
-  Ref<XQueryError> error;
-  context->contextSetClient(std::make_shared<Client>(
-      [&](XQueryContext&) { static_cast<void>(XQuery::xqueryWithSource("1")); }));
-  context->contextSetLimits(outerLimits);
-  EXPECT_FALSE(context->evaluateXQuery(*tracing, {}, nullptr, &error));
-  isOver = true;
-  other.join();
-  ASSERT_TRUE(error);
-  EXPECT_EQ(error->msg()->utf8(), "limit: deadline passed");
-  EXPECT_FALSE(XQuery::xqueryWithSource("1")->parseErrors());
 }
 
 TEST_F(LimitWatch, ImportingAModuleFromASlowServerEndsAtTheLimit) {

@@ -1,7 +1,6 @@
 // Drives the scanner alone over a text.
 #pragma once
 
-#include "Parser/ScannerActions.h"
 #include "Parser/XQueryParser.h"
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
@@ -34,14 +33,17 @@ class Scanned {
     Ref<XQueryParser> parser =
         XQueryParser::unparsedParserWithSource(NSString::stringWithUTF8(text));
     const XQueryParser::Session session(*parser);
-    XQueryScannerInit(startState);
-    for (const int state : stack) XQScanStatePush(state);
-    while (const int code = XQlex()) {
-      tokens.push_back(record(code));
+    XQueryScanner& scanner = parser->scanner();
+    scanner.XQueryScannerInit(startState);
+    for (const int state : stack) scanner.XQScanStatePush(state);
+    XQueryTokenValue value;
+    while (const int code = scanner.XQlex(value)) {
+      EXPECT_EQ(value.token, code);
+      tokens.push_back(record(value, scanner));
       if (code == kTokenError) break;
     }
-    endState = sXQueryScannerState;
-    endLine = XQlineno;
+    endState = scanner.state();
+    endLine = scanner.line();
     for (const auto& error : parser->errors()) {
       errors.push_back(error->localizedDescription()->utf8());
     }
@@ -70,21 +72,20 @@ class Scanned {
   int endLine = 0;
 
  private:
-  static ScannedToken record(int code) {
+  static ScannedToken record(const XQueryTokenValue& value, const XQueryScanner& scanner) {
     ScannedToken token;
-    token.code = code;
-    EXPECT_EQ(XQlval.token, code);
-    token.line = XQlval.line;
-    if (XQTokenIsCharacter(code)) {
-      token.unit = XQlval.unit;
+    token.code = value.token;
+    token.line = value.line;
+    if (XQTokenIsCharacter(token.code)) {
+      token.unit = value.unit;
       char bytes[3];
       token.text = std::string(bytes, static_cast<size_t>(UniCodeToUTF8(token.unit, bytes)));
-    } else if (XQlval.value) {
-      token.text = cast<NSString>(XQlval.value)->utf8();
+    } else if (value.value) {
+      token.text = cast<NSString>(value.value)->utf8();
     }
-    if (XQlval.source) token.source = cast<NSString>(XQlval.source)->utf8();
-    token.state = sXQueryScannerState;
-    token.stack.assign(sXQueryScannerStateStack.begin(), sXQueryScannerStateStack.end());
+    if (value.source) token.source = cast<NSString>(value.source)->utf8();
+    token.state = scanner.state();
+    token.stack.assign(scanner.stateStack().begin(), scanner.stateStack().end());
     return token;
   }
 };

@@ -24,10 +24,12 @@ std::string error(const std::string& message, int line) {
 std::u16string literal(std::string_view text) {
   Ref<XQueryParser> parser = XQueryParser::unparsedParserWithSource(NSString::stringWithUTF8(text));
   const XQueryParser::Session session(*parser);
-  XQueryScannerInit(XQueryStateDEFAULT);
-  EXPECT_EQ(XQlex(), kTokenStringLiteral);
-  EXPECT_EQ(sXQueryScannerState, XQueryStateOPERATOR);
-  return cast<NSString>(XQlval.value)->view().utf16();
+  XQueryScanner& scanner = parser->scanner();
+  scanner.XQueryScannerInit(XQueryStateDEFAULT);
+  XQueryTokenValue value;
+  EXPECT_EQ(scanner.XQlex(value), kTokenStringLiteral);
+  EXPECT_EQ(scanner.state(), XQueryStateOPERATOR);
+  return cast<NSString>(value.value)->view().utf16();
 }
 
 // --- start -------------------------------------------------------------------------------------

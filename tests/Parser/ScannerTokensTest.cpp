@@ -142,7 +142,7 @@ const Row rows[] = {
     {EC, "x", kTokenElementContentChar, "x", EC},
     {EC, " ", kTokenElementContentCharWS, " ", EC},
     {EC, "\t", kTokenElementContentCharWS, "\t", EC},
-    {EC, "\r", kTokenElementContentCharWS, "\r", EC},
+    {EC, "\r", kTokenElementContentCharWS, "\n", EC},
     {EC, "\n", kTokenElementContentCharWS, "\n", EC},
     {D, "element {", kTokenElementCurlyBraceLeft, "", D, {EC, O}},
     {D, "element (", kTokenElementParenLeft, "", KT, {EC, O}},
