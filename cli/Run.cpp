@@ -47,13 +47,7 @@ std::string readFile(const std::string& path) {
 
 Ref<NSString> queryText(const Options& options) {
   const std::string bytes = options.queryText ? *options.queryText : readFile(options.queryFile);
-  std::string_view source = bytes;
-  // The signature that some editors put before UTF-8 belongs to the file, not to the query.
-  constexpr std::string_view signature = "\xEF\xBB\xBF";
-  if (!options.queryText && source.substr(0, signature.size()) == signature) {
-    source.remove_prefix(signature.size());
-  }
-  const Ref<NSString> text = NSString::stringWithUTF8(source);
+  const Ref<NSString> text = NSString::stringWithUTF8(bytes);
   if (!text) {
     const std::string name = options.queryText ? "the query given with -e" : options.queryFile;
     stop(StatusInput, "xquery: " + name + ": not UTF-8 text");
@@ -92,8 +86,12 @@ XQueryConstants bindConstants(const Options& options) {
   return constants;
 }
 
-Ref<XQuery> compile(const Ref<NSString>& source) {
-  Ref<XQuery> query = XQuery::xqueryWithSource(source);
+// What a query names beside it is looked for beside its file, or in the working folder.
+Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
+  XQueryLoading loading;
+  const auto URL = NSURL::fileURLWithPath(options.queryText ? "./" : options.queryFile);
+  if (URL) loading.moduleURL = URL->absoluteString()->utf8();
+  Ref<XQuery> query = XQuery::xqueryWithSource(source, loading);
   const Ref<NSArray> errors = query->parseErrors();
   if (!errors || errors->count() == 0) return query;
   std::string text;
@@ -161,7 +159,7 @@ bool print(const Options& options, const NSArray* items) {
 void runPhases(const Options& options) {
   Phases phases;
   const Ref<NSString> source = queryText(options);
-  const Ref<XQuery> query = phases.compile.measure([&] { return compile(source); });
+  const Ref<XQuery> query = phases.compile.measure([&] { return compile(options, source); });
   Value contextItem;
   const XQueryConstants constants = phases.parse.measure([&] {
     if (options.input) {

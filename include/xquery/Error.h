@@ -52,6 +52,8 @@ class XQUERY_EXPORT NSError : public NSCounted {
 // from 1; 0 means that no line is known. With the environment variable XQUERY_LOG set (not empty
 // and not "0"), making one logs its description.
 //
+// An error of a library module that a query imports knows the module's URL; its line is one there.
+//
 //   if (error->err() == 8) undefined(error->msg()->utf8(), error->line());
 //   log(error->description()->utf8());   // XQueryError:8 - "reference to ..." at line:3
 class XQUERY_EXPORT XQueryError : public NSError {
@@ -68,18 +70,26 @@ class XQUERY_EXPORT XQueryError : public NSError {
                                               int64_t atLine);
   [[nodiscard]] static Ref<XQueryError> error(int64_t number, std::string_view withMsg);
 
+  // The same error, known to be one of the module at that URL.
+  [[nodiscard]] static Ref<XQueryError> errorInModule(const XQueryError& error,
+                                                      Ref<NSString> moduleURL);
+
   // The same as the code.
   int64_t err() const { return _err; }
   // May be null.
   const Ref<NSString>& msg() const { return _msg; }
   int64_t line() const { return _line; }
+  // Null for an error of the query itself, and for one that arises while it is evaluated.
+  const Ref<NSString>& moduleURL() const { return _moduleURL; }
 
   // XQueryError:3 - "message" at line:5, or without the last part when no line is known. A missing
-  // message prints as (null).
+  // message prints as (null). For an error of a module a second line names it, and its line again:
+  // two blanks, "at ", the URL and ":5".
   Ref<NSString> localizedDescription() const override;
 
  protected:
   XQueryError(int64_t number, Ref<NSString> msg, int64_t line);
+  XQueryError(const XQueryError& error, Ref<NSString> moduleURL);
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
@@ -87,6 +97,7 @@ class XQUERY_EXPORT XQueryError : public NSError {
   int64_t _err;
   Ref<NSString> _msg;
   int64_t _line;
+  Ref<NSString> _moduleURL;
 };
 
 // The one exception type of the engine, thrown and caught inside it; a run-time error has the name

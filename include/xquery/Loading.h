@@ -100,12 +100,17 @@ class XQUERY_EXPORT XQueryLoader {
 //
 //   XQueryLoading loading;
 //   loading.policy = XQueryLoadingPolicy::denyAll();
+//   loading.moduleURL = NSURL::fileURLWithPath("reports/sales.xq")->absoluteString()->utf8();
 //   auto query = XQuery::xqueryWithSource(text, loading);
 //   context->contextSetLoading(loading);
 struct XQueryLoading {
   XQueryLoadingPolicy policy = XQueryLoadingPolicy::allowAll();
   XQueryLoadingLimits limits;
   std::shared_ptr<XQueryLoader> loader;  // null for the library's own
+  // For a compilation: the absolute URL of the query's text, in UTF-8. The relative locations of
+  // modules, documents and stylesheets that it names are resolved against it unless it declares a
+  // base URI; it shows nowhere else. Empty for none. Library modules have their own.
+  std::string moduleURL;
 };
 
 }  // namespace xquery

@@ -5,6 +5,7 @@
 #include "xquery/String.h"
 
 #include <string>
+#include <string_view>
 
 namespace xquery {
 
@@ -18,6 +19,10 @@ class XQUERY_EXPORT NSURL : public NSCounted {
   [[nodiscard]] static Ref<NSURL> URLWithString(const Ref<NSString>& text);
   // RFC 3986 resolution against an absolute base. Null when either does not parse.
   [[nodiscard]] static Ref<NSURL> URLWithString(const Ref<NSString>& text, const NSURL& base);
+
+  // The URL of a file or folder. A relative path is one below the working folder; a folder's URL
+  // ends with "/" if its path does, as "./" does. Null when there is no working folder.
+  [[nodiscard]] static Ref<NSURL> fileURLWithPath(std::string_view path);
 
   // The text as given (for a resolved reference: the resolved text).
   const Ref<NSString>& absoluteString() const { return _text; }

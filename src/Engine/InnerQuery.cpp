@@ -4,6 +4,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/XMLNode.h"
 
@@ -38,6 +39,13 @@ void refuseOtherItems(XQueryInnerResult& result) {
   }
 }
 
+// The text of an inner query stands in the module that is being evaluated.
+std::string moduleURLOf(const XQueryContext& context) {
+  const XQueryProlog* prolog = context._internal().activeProlog();
+  const bool isKnown = prolog && prolog->moduleURL();
+  return isKnown ? prolog->moduleURL()->absoluteString()->utf8() : std::string();
+}
+
 // For a caller without an evaluation of its own.
 Ref<NSArray> itemsOrError(XQueryInnerResult result, Ref<NSError>* error) {
   if (error) *error = result.error;
@@ -59,7 +67,9 @@ XQueryInnerResult XQueryEvaluateInnerQuery(const Ref<NSString>& source, const Va
   XQueryCheckStack(outer);
   const OneDeeper deeper(outer);
   const Ref<XQueryContext> context = XQueryNestedContext(outer);
-  const Ref<XQuery> query = XQuery::xqueryWithSource(source, context->contextLoading());
+  XQueryLoading loading = context->contextLoading();
+  loading.moduleURL = moduleURLOf(outer);
+  const Ref<XQuery> query = XQuery::xqueryWithSource(source, loading);
   XQueryInnerResult result;
   result.items = context->evaluateXQuery(*query, {}, contextItem, &result.error);
   if (XQueryIsLimit(result.error.get())) outer._internal().raise(result.error);

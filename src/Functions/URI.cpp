@@ -3,6 +3,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Functions/Context.h"
+#include "Prolog/XQueryProlog.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryTypeTable.h"
@@ -25,7 +26,8 @@ Value asURI(const Ref<NSString>& text, XQueryContext& context) {
 }  // namespace
 
 Ref<NSURL> XQueryURLInContext(const Ref<NSString>& reference, XQueryContext& context) {
-  return resolvedURL(reference, context._internal().baseURI());
+  const XQueryProlog* prolog = context._internal().activeProlog();
+  return prolog ? prolog->URLForLocation(reference) : NSURL::URLWithString(reference);
 }
 
 Value fn_base_uri(const Value* arguments, size_t count, XQueryContext& context) {

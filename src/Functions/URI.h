@@ -17,8 +17,8 @@ Value fn_doc(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_collection(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_resolve_uri(const Value* arguments, size_t count, XQueryContext& context);
 
-// The reference resolved against the static base URI; by itself where there is none that anything
-// can be resolved against. Null for a text that is no URI reference.
+// The reference resolved against what locations of the active module are resolved against; by
+// itself where there is nothing. Null for a text that is no URI reference.
 Ref<NSURL> XQueryURLInContext(const Ref<NSString>& reference, XQueryContext& context);
 
 }  // namespace xquery

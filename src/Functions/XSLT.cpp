@@ -3,6 +3,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Functions/URI.h"
 #include "Platform/Stylesheets/Stylesheet.h"
+#include "Prolog/XQueryProlog.h"
 #include "Types/XQueryTypeTable.h"
 
 namespace xquery {
@@ -21,12 +22,13 @@ Value ext_xslt(const Value* arguments, size_t count, XQueryContext& context) {
   const NSXMLDocument* document = documentOf(arguments, count);
   if (!document) return Value();
   const Value stylesheet = XQueryPromoteToString(arguments[1], context);
-  const Ref<NSString> base = context._internal().baseURI();
+  const XQueryProlog* prolog = context._internal().activeProlog();
+  const Ref<NSURL> base = prolog ? prolog->locationBase() : Ref<NSURL>();
   // The host may set other settings while its loader is called.
   const Ref<NSURLLoader> loader = &context._internal().loader();
   std::string ignored;
   return XMLResultOfStylesheet(*document, *cast<NSString>(stylesheet.get()),
-                               base ? base->utf8() : "", {}, *loader, ignored);
+                               base ? base->absoluteString()->utf8() : "", {}, *loader, ignored);
 }
 
 Value ext_xslt_uri(const Value* arguments, size_t count, XQueryContext& context) {

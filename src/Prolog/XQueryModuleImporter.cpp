@@ -27,15 +27,13 @@ void XQueryModuleImporter::step() {
 void XQueryModuleImporter::goOn(Importer& importer) {
   ++importer.import;
   importer.nextLocation = 0;
+  importer.reasons.clear();
 }
 
 // One attempt at the import at hand.
 void XQueryModuleImporter::resolve(Importer& importer) {
   XQueryProlog& prolog = *importer.prolog;
   const XQueryPrologItemModuleImport& item = *prolog.moduleImports()[importer.import];
-  const auto fail = [&] {
-    prolog.addError(XQueryErrors::moduleNotFound.error(item.description()));
-  };
   if (importer.nextLocation == 0) {
     const int64_t id = prolog.namespaceID(item.namespaceString());
     if (const XQueryProlog* module = prolog.modules().prologForID(id)) {
@@ -45,22 +43,29 @@ void XQueryModuleImporter::resolve(Importer& importer) {
   }
   const XQueryPrologItemLocations& locations = item.locations();
   if (locations && importer.nextLocation < locations->size()) {
-    return tryLocation(prolog, (*locations)[importer.nextLocation++]);
+    return tryLocation(importer, (*locations)[importer.nextLocation++]);
   }
+  const auto fail = [&] {
+    prolog.addError(XQueryErrors::moduleNotFound.error(item.description()));
+  };
   fail();
   // Without any location clause the failure is recorded twice.
   if (!locations) fail();
+  for (const auto& reason : importer.reasons) prolog.addError(reason);
   goOn(importer);
 }
 
 // Starts building the module, if there is one; whether it will do is seen when it is finished.
-void XQueryModuleImporter::tryLocation(XQueryProlog& importer, const Ref<NSString>& location) {
-  const auto source = importer.modules().sourceAtLocation(location);
+void XQueryModuleImporter::tryLocation(Importer& importer, const Ref<NSString>& location) {
+  XQueryModules& modules = importer.prolog->modules();
+  const auto URL = importer.prolog->URLForLocation(location);
+  const auto source = URL ? modules.sourceAtURL(URL) : Ref<NSString>();
   if (!source) return;
   const auto [module, errors] = XQueryParseModule(source);
-  if (!module || !errors.empty()) return;
-  auto prolog = make<XQueryProlog>(Ref<XQueryModules>(&importer.modules()));
-  prolog->_start(module->prologItems(), location, module->version());
+  if (!errors.empty()) return noteReasons(importer, errors, *URL);
+  if (!module) return;
+  auto prolog = make<XQueryProlog>(Ref<XQueryModules>(&modules));
+  prolog->_start(module->prologItems(), location, module->version(), URL);
   _importers.push_back({std::move(prolog)});
 }
 
@@ -68,10 +73,29 @@ void XQueryModuleImporter::finish() {
   const Ref<XQueryProlog> prolog = std::move(_importers.back().prolog);
   _importers.pop_back();
   prolog->_bindInfo();
-  if (_importers.empty() || !prolog->isModule() || !prolog->errors().empty()) return;
+  if (_importers.empty()) return;
   Importer& importer = _importers.back();
+  if (!prolog->errors().empty()) {
+    return noteReasons(importer, prolog->errors(), *prolog->moduleURL());
+  }
+  if (!prolog->isModule()) return;
   importer.prolog->_importDeclarations(*prolog);
   goOn(importer);
+}
+
+// The first error of a module, and behind an import that failed the reasons for that: they are
+// errors of other modules.
+void XQueryModuleImporter::noteReasons(Importer& importer,
+                                       const std::vector<Ref<XQueryError>>& errors,
+                                       const NSURL& URL) {
+  constexpr size_t mostReasons = 100;
+  bool isFirst = true;
+  for (const auto& error : errors) {
+    if (importer.reasons.size() == mostReasons || (!isFirst && !error->moduleURL())) return;
+    importer.reasons.push_back(isFirst ? XQueryError::errorInModule(*error, URL.absoluteString())
+                                       : error);
+    isFirst = false;
+  }
 }
 
 }  // namespace xquery

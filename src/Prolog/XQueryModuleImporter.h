@@ -3,12 +3,13 @@
 // bound.
 //
 // A module is complete before the one that imports it goes on. Chains of imports may be long, so
-// the modules at work are kept in a list and not on the stack. The process-wide lock of the parser
-// is taken for each module's text alone, never while something is fetched.
+// the modules at work are kept in a list and not on the stack.
 #pragma once
 
+#include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
+#include "xquery/URL.h"
 
 #include <cstddef>
 #include <vector>
@@ -19,8 +20,8 @@ class XQueryProlog;
 
 class XQueryModuleImporter {
  public:
-  // What goes wrong is an error of the prolog that asked for the import; what was wrong with a
-  // module that did not do is forgotten.
+  // What goes wrong is an error of the prolog that asked for the import. The first error of each
+  // module that was there and did not do follows it.
   void build(const Ref<XQueryProlog>& prolog);
 
  private:
@@ -29,11 +30,14 @@ class XQueryModuleImporter {
     Ref<XQueryProlog> prolog;
     size_t import = 0;
     size_t nextLocation = 0;
+    std::vector<Ref<XQueryError>> reasons = {};  // why the locations tried did not do
   };
 
   void step();
   void resolve(Importer& importer);
-  void tryLocation(XQueryProlog& importer, const Ref<NSString>& location);
+  void tryLocation(Importer& importer, const Ref<NSString>& location);
+  static void noteReasons(Importer& importer, const std::vector<Ref<XQueryError>>& errors,
+                          const NSURL& URL);
   void finish();
   static void goOn(Importer& importer);
 

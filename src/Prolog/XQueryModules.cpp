@@ -103,18 +103,12 @@ void XQueryModules::removePrologs() {
   const auto removed = std::move(_ownedPrologs);
 }
 
-Ref<NSString> XQueryModules::sourceAtLocation(const Ref<NSString>& location) {
-  const auto URL = NSURL::URLWithString(location);
-  if (!URL || !_loader || _sourceCount >= _loader->loading().limits.mostModules) return {};
+Ref<NSString> XQueryModules::sourceAtURL(const Ref<NSURL>& URL) {
+  if (!_loader || _sourceCount >= _loader->loading().limits.mostModules) return {};
   ++_sourceCount;
   const auto data =
       _loader->URLHandle(URL, XQueryLoadPurpose::Module, true)->resourceData(*_loader);
-  if (!data) return {};
-  std::string_view text = data->bytes();
-  // The signature that some editors put before UTF-8 belongs to the file, not to the module.
-  constexpr std::string_view signature = "\xEF\xBB\xBF";
-  if (text.starts_with(signature)) text.remove_prefix(signature.size());
-  return NSString::stringWithUTF8(text);
+  return data ? NSString::stringWithUTF8(data->bytes()) : Ref<NSString>();
 }
 
 }  // namespace xquery

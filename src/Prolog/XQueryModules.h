@@ -51,9 +51,9 @@ class XQueryModules : public NSCounted {
   void addProlog(Ref<XQueryProlog> prolog, int64_t forID);
   void removePrologs();
 
-  // The text at a location. Null when the location is no absolute URL, when it may not or cannot be
-  // read, when it is not UTF-8, and once the compilation has asked for as many as it may.
-  Ref<NSString> sourceAtLocation(const Ref<NSString>& location);
+  // The text behind a URL. Null when the URL is relative, when it may not or cannot be read, when
+  // it is not UTF-8, and once the compilation has asked for as many as it may.
+  Ref<NSString> sourceAtURL(const Ref<NSURL>& URL);
   // Nothing is loaded any more: lets go of what was fetched.
   void endLoading() { _loader = nullptr; }
 

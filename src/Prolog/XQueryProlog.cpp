@@ -3,6 +3,8 @@
 // stands for which ID.
 #include "Prolog/XQueryProlog.h"
 
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryModuleImporter.h"
 #include "Prolog/XQueryModules.h"
@@ -86,19 +88,26 @@ Ref<XQueryProlog> XQueryProlog::prologWithItems(const std::vector<Ref<XQueryProl
                                                 Ref<XQueryModules> forModules,
                                                 const Ref<NSString>& version,
                                                 Ref<NSURLLoader> loader) {
+  Ref<NSURL> moduleURL;
+  if (loader) {
+    moduleURL = NSURL::URLWithString(NSString::stringWithUTF8(loader->loading().moduleURL));
+  }
   auto prolog = make<XQueryProlog>(std::move(forModules), std::move(loader));
-  prolog->_start(items, std::move(atLocation), version);
+  prolog->_start(items, std::move(atLocation), version, std::move(moduleURL));
   XQueryModuleImporter().build(prolog);
   if (prolog->_madeModules) prolog->_modules->endLoading();
   return prolog;
 }
 
 void XQueryProlog::_start(const std::vector<Ref<XQueryPrologItem>>& items, Ref<NSString> atLocation,
-                          const Ref<NSString>& version) {
+                          const Ref<NSString>& version, Ref<NSURL> moduleURL) {
   if (version && !(version->view() == "1.0")) {
     addError(XQueryErrors::unsupportedVersion.error(version));
   }
   _location = std::move(atLocation);
+  // A relative one leads nowhere.
+  if (moduleURL && !moduleURL->scheme().empty()) _moduleURL = std::move(moduleURL);
+  findLocationBase();
   _addItems(items);
   if (isModule()) _modules->addProlog(this, namespaceIDForPrefix(_modulePrefix->view()));
 }
@@ -107,8 +116,30 @@ bool XQueryProlog::madeModules(const XQueryModules& modules) const {
   return _madeModules && _modules == &modules;
 }
 
+void XQueryProlog::setBaseURI(Ref<NSString> baseURI) {
+  _baseURI = std::move(baseURI);
+  findLocationBase();
+}
+
+// A base URI that is relative itself is one below the module's.
+void XQueryProlog::findLocationBase() {
+  _locationBase = _moduleURL;
+  if (!_baseURI) return;
+  const Ref<NSURL> declared =
+      _moduleURL ? NSURL::URLWithString(_baseURI, *_moduleURL) : NSURL::URLWithString(_baseURI);
+  if (declared && !declared->scheme().empty()) _locationBase = declared;
+}
+
+Ref<NSURL> XQueryProlog::URLForLocation(const Ref<NSString>& location) const {
+  return _locationBase ? NSURL::URLWithString(location, *_locationBase)
+                       : NSURL::URLWithString(location);
+}
+
 void XQueryProlog::_addItems(const std::vector<Ref<XQueryPrologItem>>& items) {
-  for (const auto& item : items) item->XQueryUpdateProlog(*this);
+  for (const auto& item : items) {
+    checkWork();
+    item->XQueryUpdateProlog(*this);
+  }
 }
 
 void XQueryProlog::addError(Ref<XQueryError> error) {
@@ -146,8 +177,12 @@ void XQueryProlog::setDefaultFunctionNamespace(Ref<NSString> URI) {
 }
 
 Ref<NSString> XQueryProlog::namespaceForPrefix(NSStringView prefix, bool& fromProlog) const {
+  checkWork();
+  WorkPacer pacer;
   for (auto entry = _inScopeNamespaces.rbegin(); entry != _inScopeNamespaces.rend(); ++entry) {
+    pacer.turn();
     for (const auto& node : *entry) {
+      pacer.turn();
       if (!node->nameView().equals(prefix)) continue;
       fromProlog = false;
       return node->stringValue();
@@ -248,6 +283,7 @@ Ref<XQueryQName> XQueryProlog::functionQNameFromString(const Ref<NSString>& name
 }
 
 Ref<XQueryQName> XQueryProlog::xmlQNameFromString(const Ref<NSString>& name) const {
+  checkWork();
   XQueryQName::Range prefix;
   XQueryQName::Range localPart;
   XQueryQName::parseQNameString(name->view(), prefix, localPart);

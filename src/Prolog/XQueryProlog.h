@@ -7,6 +7,7 @@
 #include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
+#include "xquery/URL.h"
 #include "xquery/XMLNode.h"
 
 #include <cstdint>
@@ -70,10 +71,20 @@ class XQueryProlog : public NSCounted {
   const Ref<NSString>& baseURI() const { return _baseURI; }
   const Ref<NSString>& modulePrefix() const { return _modulePrefix; }
   const Ref<NSString>& location() const { return _location; }
+  // The URL that the module's text is known by; null for none. It is told to nobody but to what
+  // resolves a location.
+  const Ref<NSURL>& moduleURL() const { return _moduleURL; }
+  // What relative locations are resolved against: the base URI, or the module's own URL where none
+  // is declared. Null when there is neither.
+  const Ref<NSURL>& locationBase() const { return _locationBase; }
+  // Null when the text is no URI reference. What there is no base for stays relative.
+  Ref<NSURL> URLForLocation(const Ref<NSString>& location) const;
   // The declared one, else the standard function namespace.
   Ref<NSString> defaultFunctionNamespace() const;
   int schemaMode() const { return _schemaMode; }
   bool isModule() const { return static_cast<bool>(_modulePrefix); }
+  // The modules whose declarations this one took over, in the order of the imports.
+  const std::vector<const XQueryProlog*>& importedModules() const { return _importedModules; }
   // XQueryVarDecl and XQueryFunctionDecl objects in the order they were registered.
   const std::vector<Value>& declarations() const { return _declarations; }
   const std::vector<Ref<XQueryError>>& errors() const { return _errors; }
@@ -132,7 +143,7 @@ class XQueryProlog : public NSCounted {
 
   // --- setters, used by the prolog items ---------------------------------------------------------
   void setModulePrefix(Ref<NSString> prefix) { _modulePrefix = std::move(prefix); }
-  void setBaseURI(Ref<NSString> baseURI) { _baseURI = std::move(baseURI); }
+  void setBaseURI(Ref<NSString> baseURI);
   void setXMLSpacePreserve(bool preserve) { _xmlSpacePreserve = preserve; }
   void setConstructionPreserve(bool preserve) { _constructionPreserve = preserve; }
   void setOrdered(bool ordered) { _ordered = ordered; }
@@ -166,7 +177,8 @@ class XQueryProlog : public NSCounted {
   void _addItems(const std::vector<Ref<XQueryPrologItem>>& items);
   // The first part of the building: before the imports.
   void _start(const std::vector<Ref<XQueryPrologItem>>& items, Ref<NSString> atLocation,
-              const Ref<NSString>& version);
+              const Ref<NSString>& version, Ref<NSURL> moduleURL);
+  void findLocationBase();
   void _bindInfo();
 
   struct NamedLocal {
@@ -182,6 +194,8 @@ class XQueryProlog : public NSCounted {
   Ref<NSString> _defaultFunctionNamespace;
   Ref<NSString> _baseURI;
   Ref<NSString> _location;
+  Ref<NSURL> _moduleURL;
+  Ref<NSURL> _locationBase;
   int _schemaMode = 0;
   std::vector<Ref<XQueryError>> _errors;
   std::vector<Ref<XQueryPrologItemModuleImport>> _moduleImports;
@@ -189,6 +203,7 @@ class XQueryProlog : public NSCounted {
   std::vector<Value> _namespacePrefixes;     // by ID: NSNull, a string, or an array of strings
   StringTable<int64_t> _namespacePrefixIDs;  // what was declared, over the predeclared ones
   std::vector<Value> _declarations;
+  std::vector<const XQueryProlog*> _importedModules;  // kept by the registry
   std::vector<Ref<XQueryExpr>> _qNameReferences;
   std::unordered_map<Ref<XQueryQName>, Ref<XQueryVarDecl>, XQueryQNameHash, XQueryQNameEqual>
       _variables;

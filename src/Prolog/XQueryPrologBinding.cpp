@@ -68,6 +68,7 @@ void XQueryProlog::_importDeclarations(const XQueryProlog& module) {
   // Each name of each import may be an error: of two short texts more than any memory holds.
   constexpr size_t mostErrors = 100'000;
   if (!module.isModule()) return;
+  _importedModules.push_back(&module);
   const int64_t moduleID = module.namespaceIDForPrefix(module._modulePrefix->view());
   const auto isOwn = [&](const XQueryQName& name) {
     return module.namespaceID(name.namespaceURI()) == moduleID;
@@ -104,6 +105,7 @@ void XQueryProlog::_importDeclarations(const XQueryProlog& module) {
 // otherwise a name left over from the last body would pass for a parameter given twice.
 void XQueryProlog::_bindInfo() {
   for (size_t index = 0; index < _declarations.size(); ++index) {
+    checkWork();
     _nextLocalVariableID = 1;
     const LocalScope scope = localScope();
     const Value declaration = _declarations[index];

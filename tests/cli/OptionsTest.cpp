@@ -3,6 +3,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <filesystem>
+
 using command::books;
 using command::Outcome;
 using command::readFile;
@@ -22,9 +24,10 @@ TEST(Options, TheQueryComesFromAFile) {
             "<title>A Field Guide to Lichens</title>\n<title>Brücken &amp; Wege</title>\n");
 }
 
-TEST(Options, AQueryFileMayBeginWithAnEncodingSignature) {
+TEST(Options, AQueryMayBeginWithAnEncodingSignature) {
   const TemporaryDirectory directory;
   EXPECT_EQ(xquery({directory.write("q.xq", "\xEF\xBB\xBF 1 + 1")}).out, "2\n");
+  EXPECT_EQ(xquery({"-e", "\xEF\xBB\xBF 1 + 1"}).out, "2\n");
 }
 
 TEST(Options, TheQueryMayBeginLikeAnOption) {
@@ -166,6 +169,42 @@ TEST(Options, ModulesAreReadFromFiles) {
       xquery({"-e", "import module namespace m = 'urn:m' at 'file://" + module + "'; $m:a + 1"})
           .out,
       "42\n");
+}
+
+TEST(Options, WhatAQueryFileNamesIsLookedForBesideIt) {
+  const TemporaryDirectory directory;
+  directory.write("m b.xq", "module namespace m = 'urn:m'; declare variable $m:a := doc('d.xml');");
+  directory.write("d.xml", "<d>beside</d>");
+  const std::string query = directory.write(
+      "q \xC3\xA9.xq",
+      "import module namespace m = 'urn:m' at 'm%20b.xq'; $m:a/d, doc('d.xml')/d/text()");
+  const Outcome outcome = xquery({query});
+  EXPECT_EQ(outcome.err, "");
+  EXPECT_EQ(outcome.out, "<d>beside</d>\nbeside\n");
+}
+
+TEST(Options, WhatAQueryOnTheCommandLineNamesIsLookedForInTheWorkingFolder) {
+  const TemporaryDirectory directory;
+  directory.write("m.xq", "module namespace m = 'urn:m'; declare variable $m:a := 41;");
+  const auto former = std::filesystem::current_path();
+  std::filesystem::current_path(directory.path(""));
+  const Outcome outcome = xquery({"-e", "import module namespace m = 'urn:m' at 'm.xq'; $m:a + 1"});
+  std::filesystem::current_path(former);
+  EXPECT_EQ(outcome.err, "");
+  EXPECT_EQ(outcome.out, "42\n");
+}
+
+TEST(Options, AModuleThatCannotBeUsedSaysWhy) {
+  const TemporaryDirectory directory;
+  const std::string module = directory.write("m.xq", "module namespace m = 'urn:m';\n#");
+  const Outcome outcome =
+      xquery({directory.write("q.xq", "import module namespace m = 'urn:m' at 'm.xq'; 1")});
+  EXPECT_EQ(outcome.status, 1);
+  EXPECT_EQ(outcome.err,
+            "XQueryError:47 - \"can't access module for prolog item module import:\"urn:m\" for "
+            "prefix:\"m\" at locations:\"m.xq\" line:0\"\nXQueryError:3 - \"invalid token (#) - "
+            "#\" at line:2\n  at file://" +
+                module + ":2\n");
 }
 
 TEST(Options, RepeatPrintsOnceAndTimesMedianAndMinimum) {

@@ -55,6 +55,18 @@ XQueryError::XQueryError(int64_t number, Ref<NSString> msg, int64_t line)
   if (XQueryLogEnabled()) NSLog(XQueryError::localizedDescription()->utf8());
 }
 
+// It was logged when it was made.
+XQueryError::XQueryError(const XQueryError& error, Ref<NSString> moduleURL)
+    : NSError(Kind::QueryError, errorDomain(), error.err(), userInfoFor(error.msg(), error.line())),
+      _err(error.err()),
+      _msg(error.msg()),
+      _line(error.line()),
+      _moduleURL(std::move(moduleURL)) {}
+
+Ref<XQueryError> XQueryError::errorInModule(const XQueryError& error, Ref<NSString> moduleURL) {
+  return make<XQueryError>(error, std::move(moduleURL));
+}
+
 Ref<XQueryError> XQueryError::error(int64_t number, const Ref<NSString>& withMsg, int64_t atLine) {
   return make<XQueryError>(number, withMsg, atLine + 1);
 }
@@ -82,6 +94,11 @@ Ref<NSString> XQueryError::localizedDescription() const {
   }
   text.appendASCII("\"");
   if (info && info->errorLine) text.appendASCII(" at line:" + std::to_string(*info->errorLine));
+  if (_moduleURL) {
+    text.appendASCII("\n  at ");
+    text.append(_moduleURL->view());
+    if (_line != 0) text.appendASCII(":" + std::to_string(_line));
+  }
   return text.string();
 }
 

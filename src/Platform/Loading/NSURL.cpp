@@ -2,7 +2,9 @@
 #include "Platform/Text/ASCII.h"
 #include "xquery/URL.h"
 
+#include <filesystem>
 #include <string_view>
+#include <system_error>
 
 namespace xquery {
 
@@ -51,7 +53,36 @@ std::string unescaped(std::string_view text) {
   return out;
 }
 
+// What a path may hold as it is, of the characters that a URL allows there.
+bool isPlainInPath(char byte) {
+  constexpr std::string_view marks = "/-._~!$&'()*+,;=:@";
+  const char lower = lowerCase(byte);
+  return (lower >= 'a' && lower <= 'z') || (byte >= '0' && byte <= '9') ||
+         marks.find(byte) != marks.npos;
+}
+
+std::string escapedPath(std::string_view path) {
+  constexpr std::string_view digits = "0123456789ABCDEF";
+  std::string out;
+  for (const char byte : path) {
+    const auto value = static_cast<unsigned char>(byte);
+    if (isPlainInPath(byte)) {
+      out += byte;
+    } else {
+      out += {'%', digits[value >> 4], digits[value & 15]};
+    }
+  }
+  return out;
+}
+
 }  // namespace
+
+Ref<NSURL> NSURL::fileURLWithPath(std::string_view path) {
+  std::error_code failure;
+  const std::string absolute = std::filesystem::absolute(path, failure).string();
+  if (failure) return nullptr;
+  return make<NSURL>(NSString::stringWithASCII("file://" + escapedPath(absolute)));
+}
 
 Ref<NSURL> NSURL::URLWithString(const Ref<NSString>& text) {
   // Every character of a URI is ASCII.

@@ -56,6 +56,23 @@ TEST(Error, CarriesDomainNumberAndMessage) {
   EXPECT_TRUE(isa<NSError>(static_cast<NSObject*>(error.get())));
 }
 
+TEST(Error, OfAModuleNamesItOnALineOfItsOwn) {
+  const auto error = XQueryError::error(8, "message", 4);
+  EXPECT_FALSE(error->moduleURL());
+  const auto inModule =
+      XQueryError::errorInModule(*error, NSString::stringWithASCII("file:///a/m.xq"));
+  EXPECT_EQ(inModule->moduleURL()->utf8(), "file:///a/m.xq");
+  EXPECT_EQ(inModule->err(), 8);
+  EXPECT_EQ(inModule->code(), 8);
+  EXPECT_EQ(inModule->line(), 5);
+  EXPECT_EQ(inModule->userInfo()->errorLine, 5);
+  EXPECT_EQ(inModule->description()->utf8(),
+            "XQueryError:8 - \"message\" at line:5\n  at file:///a/m.xq:5");
+  const auto withoutLine = XQueryError::errorInModule(*XQueryError::error(47, "message"),
+                                                      NSString::stringWithASCII("urn:m"));
+  EXPECT_EQ(withoutLine->description()->utf8(), "XQueryError:47 - \"message\"\n  at urn:m");
+}
+
 TEST(Error, NewErrorsAreLoggedOnlyWhenDiagnosticsAreOn) {
   ::setenv("XQUERY_LOG", "1", 1);
   testing::internal::CaptureStderr();

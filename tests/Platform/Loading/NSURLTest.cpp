@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <filesystem>
 #include <string>
 
 namespace xquery {
@@ -189,6 +190,21 @@ TEST(URL, RelativePathIsThatOfTheReferenceAsGiven) {
   EXPECT_EQ(relativePath("?y"), "");
   EXPECT_EQ(relativePath("http://g/d.%68tm"), "/d.htm");
   EXPECT_EQ(NSURL::URLWithString(text("?y"), *base)->path(), "/a/b.html");
+}
+
+TEST(URL, OfAFileIsMadeOfItsPath) {
+  const auto URL = [](std::string_view path) {
+    return NSURL::fileURLWithPath(path)->absoluteString()->utf8();
+  };
+  EXPECT_EQ(URL("/a/b.xq"), "file:///a/b.xq");
+  EXPECT_EQ(URL("/a b/100%/#?[]\\\xC3\xA9"), "file:///a%20b/100%25/%23%3F%5B%5D%5C%C3%A9");
+  EXPECT_EQ(URL("/-._~!$&'()*+,;=:@"), "file:///-._~!$&'()*+,;=:@");
+  const auto folder = NSURL::fileURLWithPath("./");
+  const auto file = NSURL::fileURLWithPath("x.xml");
+  EXPECT_EQ(file->path(), (std::filesystem::current_path() / "x.xml").string());
+  EXPECT_EQ(NSURL::URLWithString(NSString::stringWithASCII("x.xml"), *folder)->path(),
+            file->path());
+  EXPECT_EQ(NSURL::fileURLWithPath("/a \xFF")->path(), "/a \xFF");
 }
 
 TEST(URL, VeryLongReferencesAreHandled) {
