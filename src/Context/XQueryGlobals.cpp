@@ -1,9 +1,10 @@
 // Global variables before the body runs.
 //
-// A prolog's list of declarations holds its own and those of the modules it imports, each evaluated
-// in the static context of the module that declared it. A module that only another module imports
-// has no place in the main module's list, yet the functions of its importer use its variables: they
-// get their values first of all, a module's own imports before the module.
+// A module's variables get their values before those of whoever imports it, each module's once and
+// in the order of the imports, and in the static context of that module. So an initializer finds
+// the variables that it reads, and the functions that it calls find theirs, also those of a module
+// that only another module imports. Where modules import each other, the one that is met first
+// waits for the other.
 #include "Context/XQueryGlobals.h"
 
 #include "Context/StackGuard.h"
@@ -48,39 +49,29 @@ void checkFunction(const XQueryFunctionDecl& declaration, XQueryContextInternal&
   }
 }
 
-const XQueryProlog& ownerOf(const Value& declaration) {
-  if (const auto* variable = dyn_cast<XQueryVarDecl>(declaration)) return variable->prolog();
-  return cast<XQueryFunctionDecl>(declaration)->prolog();
+void evaluateVariablesOf(const XQueryProlog& module, XQueryContext& context) {
+  for (const Value& declaration : module.declarations()) {
+    const auto* variable = dyn_cast<XQueryVarDecl>(declaration);
+    if (variable && &variable->prolog() == &module) evaluateVariable(*variable, context);
+  }
 }
 
-// The variables of the modules that the main module does not import itself. Modules are found by
-// the declarations taken over from them: one that nothing was taken over from cannot be used.
-class IndirectVariables {
+// What the main module imports, directly or not.
+class ImportedVariables {
  public:
-  IndirectVariables(const XQueryProlog& main, XQueryContext& context)
-      : _main(main), _context(context), _seen{&main} {}
+  ImportedVariables(const XQueryProlog& main, XQueryContext& context)
+      : _context(context), _seen{&main} {}
 
   void evaluateImportsOf(const XQueryProlog& importer) {
     XQueryCheckStack(_context);
-    for (const Value& declaration : importer.declarations()) {
-      const XQueryProlog& module = ownerOf(declaration);
-      if (!_seen.insert(&module).second) continue;
-      evaluateImportsOf(module);
-      evaluateVariablesOf(module);
+    for (const XQueryProlog* module : importer.importedModules()) {
+      if (!_seen.insert(module).second) continue;
+      evaluateImportsOf(*module);
+      evaluateVariablesOf(*module, _context);
     }
   }
 
  private:
-  void evaluateVariablesOf(const XQueryProlog& module) {
-    for (const Value& declaration : module.declarations()) {
-      const auto* variable = dyn_cast<XQueryVarDecl>(declaration);
-      if (!variable || &variable->prolog() != &module) continue;
-      const bool hasItsPlace = _main.variableInfoForQName(variable->name()) == variable;
-      if (!hasItsPlace) evaluateVariable(*variable, _context);
-    }
-  }
-
-  const XQueryProlog& _main;
   XQueryContext& _context;
   std::unordered_set<const XQueryProlog*> _seen;
 };
@@ -99,10 +90,12 @@ void XQuerySetConstants(const XQueryConstants& constants, const XQueryProlog& pr
 }
 
 void XQueryEvaluateDeclarations(const XQueryProlog& prolog, XQueryContext& context) {
-  IndirectVariables(prolog, context).evaluateImportsOf(prolog);
+  if (!prolog.importedModules().empty()) {
+    ImportedVariables(prolog, context).evaluateImportsOf(prolog);
+  }
   for (const Value& declaration : prolog.declarations()) {
     if (const auto* variable = dyn_cast<XQueryVarDecl>(declaration)) {
-      evaluateVariable(*variable, context);
+      if (&variable->prolog() == &prolog) evaluateVariable(*variable, context);
     } else if (const auto* function = dyn_cast<XQueryFunctionDecl>(declaration)) {
       checkFunction(*function, context._internal());
     }

@@ -12,9 +12,9 @@ class XQueryProlog;
 void XQuerySetConstants(const XQueryConstants& constants, const XQueryProlog& prolog,
                         XQueryContext& context);
 
-// Gives every variable that the prolog declares or imported its value, in declaration order. Raises
-// error 16 for an external variable without a value, for an initializer without one, and for any
-// external function.
+// Gives every variable that the prolog declares or imported its value, the imported ones first,
+// each module's in declaration order. Raises error 16 for an external variable without a value, for
+// an initializer without one, and for any external function.
 void XQueryEvaluateDeclarations(const XQueryProlog& prolog, XQueryContext& context);
 
 }  // namespace xquery

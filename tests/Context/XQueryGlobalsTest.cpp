@@ -152,11 +152,11 @@ TEST_F(Globals, AnInitializerSeesTheStaticContextOfItsModule) {
   EXPECT_TRUE(context->_internal().ordered());
 }
 
-TEST_F(Globals, ImportedVariablesComeAfterOwnOnes) {
+TEST_F(Globals, ImportedVariablesComeBeforeOwnOnes) {
   module("m", {variable("m:x", noting("m:x"))});
   const auto main = prologOf({import("urn:m"), variable("own", noting("own"))}, modules);
   evaluate(*main);
-  EXPECT_EQ(evaluated, (Names{"own", "m:x"}));
+  EXPECT_EQ(evaluated, (Names{"m:x", "own"}));
 }
 
 TEST_F(Globals, WhatOnlyAnotherModuleImportsComesBeforeItsImporter) {
@@ -165,7 +165,7 @@ TEST_F(Globals, WhatOnlyAnotherModuleImportsComesBeforeItsImporter) {
   module("m", {function("m:f"), variable("m:x", noting("m:x")), import("urn:n")});
   const auto main = prologOf({import("urn:m"), variable("own", noting("own"))}, modules);
   evaluate(*main);
-  EXPECT_EQ(evaluated, (Names{"k:z", "n:y", "own", "m:x"}));
+  EXPECT_EQ(evaluated, (Names{"k:z", "n:y", "m:x", "own"}));
   EXPECT_EQ(global("y", "urn:n"), "v");
   EXPECT_EQ(global("z", "urn:k"), "v");
 }
@@ -179,12 +179,28 @@ TEST_F(Globals, AModuleImportedAlongTwoWaysIsEvaluatedOnce) {
   EXPECT_EQ(evaluated, (Names{"n:y", "a:x", "b:x"}));
 }
 
-TEST_F(Globals, AModuleThatTheMainModuleImportsTooHasItsPlaceThere) {
+TEST_F(Globals, AModuleThatTheMainModuleImportsTooComesBeforeItsOtherImporters) {
   module("n", {variable("n:y", noting("n:y"))});
   module("m", {variable("m:x", noting("m:x")), import("urn:n")});
-  const auto main = prologOf({import("urn:m"), import("urn:n")}, modules);
-  evaluate(*main);
-  EXPECT_EQ(evaluated, (Names{"m:x", "n:y"}));
+  evaluate(*prologOf({import("urn:m"), import("urn:n")}, modules));
+  EXPECT_EQ(evaluated, (Names{"n:y", "m:x"}));
+  evaluated.clear();
+  evaluate(*prologOf({import("urn:n"), import("urn:m")}, modules));
+  EXPECT_EQ(evaluated, (Names{"n:y", "m:x"}));
+}
+
+TEST_F(Globals, ModulesComeInTheOrderOfTheImports) {
+  module("a", {variable("a:x", noting("a:x"))});
+  module("b", {variable("b:x", noting("b:x")), variable("b:y", noting("b:y"))});
+  evaluate(*prologOf({import("urn:b"), variable("own", noting("own")), import("urn:a")}, modules));
+  EXPECT_EQ(evaluated, (Names{"b:x", "b:y", "a:x", "own"}));
+}
+
+TEST_F(Globals, AModuleThatDeclaresNothingHandsItsImportsVariablesOn) {
+  module("n", {variable("n:y", noting("n:y"))});
+  module("m", {import("urn:n")});
+  evaluate(*prologOf({import("urn:m")}, modules));
+  EXPECT_EQ(evaluated, Names{"n:y"});
 }
 
 TEST_F(Globals, ExternalVariableOfAnIndirectModuleNeedsAValue) {
