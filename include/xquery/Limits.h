@@ -1,13 +1,14 @@
-// What an evaluation may take before it is ended.
+// What an evaluation or a compilation may take before it is ended.
 //
-// Reaching a limit ends the evaluation with error 0 and a message that begins with "limit: ". No
-// limit is set unless the host sets one; two hold always: nesting, by the stack of the calling
-// thread ("limit: expression nested too deeply"), and the memory of the machine.
+// Reaching a limit ends it with error 0 and a message that begins with "limit: ". No limit is set
+// unless the host sets one; two hold always: nesting, by the stack of the calling thread ("limit:
+// expression nested too deeply"), and the memory of the machine.
 //
 //   XQueryLimits limits;
 //   limits.duration = std::chrono::seconds(2);
 //   limits.cancelled = std::make_shared<std::atomic<bool>>(false);
 //   limits.memoryCeiling = 512 * 1024 * 1024;
+//   auto query = XQuery::xqueryWithSource(text, XQueryLoading(), limits);
 //   context->contextSetLimits(limits);
 //   ... on another thread: limits.cancelled->store(true);
 //
@@ -24,8 +25,8 @@
 namespace xquery {
 
 struct XQueryLimits {
-  // How long one evaluation may take: "limit: deadline passed". Counted from its beginning; zero or
-  // less ends it at once.
+  // How long one evaluation or compilation may take: "limit: deadline passed". Counted from its
+  // beginning; zero or less ends it at once.
   std::optional<std::chrono::nanoseconds> duration;
   // The time after which no evaluation goes on; with a duration as well the earlier one counts.
   std::optional<std::chrono::steady_clock::time_point> deadline;

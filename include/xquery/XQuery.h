@@ -1,7 +1,7 @@
 // Compile a query once, evaluate it as often as you like.
 //
 // A query is immutable and may be evaluated by several threads at once, each with a context of its
-// own. A context is for one thread at a time. Compilations are serialised by one lock.
+// own. A context is for one thread at a time. Any number of threads may compile at once.
 //
 // Failures are handed back as XQueryError objects; the engine throws nothing at its caller. What a
 // host's own client throws passes through, and so does what ends an evaluation at one of its limits
@@ -42,21 +42,31 @@ class XQUERY_EXPORT XQuery : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Query; }
 
-  // Never null: a query that fails to compile carries its errors.
+  // Never null: a query that fails to compile carries its errors, and so does one without a source.
   [[nodiscard]] static Ref<XQuery> xqueryWithSource(const Ref<NSString>& source);
   // UTF-8 text; text that is not well-formed UTF-8 is a compile error (3, no line).
   [[nodiscard]] static Ref<XQuery> xqueryWithSource(std::string_view source);
   // Library modules are fetched while the query is compiled, from the locations that the imports
-  // name, which are absolute URLs. `loading` says how; without it any file, http and https URL is
-  // read. A module that cannot be had is a compile error (47).
+  // name. `loading` says how, and what relative locations are resolved against; without it any
+  // file, http and https URL is read, and a location must be absolute. A module that cannot be had
+  // is a compile error (47).
   [[nodiscard]] static Ref<XQuery> xqueryWithSource(const Ref<NSString>& source,
                                                     const XQueryLoading& loading);
   [[nodiscard]] static Ref<XQuery> xqueryWithSource(std::string_view source,
                                                     const XQueryLoading& loading);
+  // The limits are those of the compilation alone, the fetching of modules included; the query that
+  // reaches one has the compile error 0 with a message that begins with "limit: ". A ceiling counts
+  // the compiled query and what compiling it takes.
+  [[nodiscard]] static Ref<XQuery> xqueryWithSource(const Ref<NSString>& source,
+                                                    const XQueryLoading& loading,
+                                                    const XQueryLimits& limits);
+  [[nodiscard]] static Ref<XQuery> xqueryWithSource(std::string_view source,
+                                                    const XQueryLoading& loading,
+                                                    const XQueryLimits& limits);
 
   // Null when the query compiled, else a new array of one XQueryError or more in the order found:
   // those of the parser, or, when it found none, those of the prolog and of names that do not
-  // resolve.
+  // resolve. A module that was found but cannot be used has its own first error after the 47.
   Ref<NSArray> parseErrors() const;
 
   // For the engine itself.

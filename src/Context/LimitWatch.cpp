@@ -35,8 +35,14 @@ thread_local XQueryLimitWatch* innermost = nullptr;
 }  // namespace
 
 XQueryLimitWatch::XQueryLimitWatch(XQueryContext& context)
+    : XQueryLimitWatch(context.contextLimits(), &context) {}
+
+XQueryLimitWatch::XQueryLimitWatch(const XQueryLimits& limits)
+    : XQueryLimitWatch(limits, nullptr) {}
+
+XQueryLimitWatch::XQueryLimitWatch(const XQueryLimits& limits, XQueryContext* context)
     : _context(context),
-      _limits(context.contextLimits()),
+      _limits(limits),
       _deadline(deadlineOf(_limits)),
       _around(innermost),
       _outer(workMeter),
@@ -87,10 +93,11 @@ void XQueryLimitWatch::lookAtWork() {
   if (_isRaising) return;  // making the error is work, too
   if (!reachedLimit()) return;
   _isRaising = true;
-  const Ref<XQueryError> error = _reached->error();
+  _error = _reached->error();
   _isRaising = false;
   workMeter.stepsLeft = 0;
-  _context._internal().raise(error);
+  if (_context) _context->_internal().raise(_error);
+  throw NSException("XQueryError", _error->description());
 }
 
 const XQueryErrorText<>& XQueryLimitWatch::allocationFailure() const {

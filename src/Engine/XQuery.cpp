@@ -12,10 +12,51 @@
 #include "Types/XQueryValues.h"
 #include "xquery/XMLNode.h"
 
+#include <functional>
 #include <new>
 #include <stdexcept>
 
 namespace xquery {
+
+namespace {
+
+using Internal = std::unique_ptr<XQueryInternal>;
+
+Internal failed(Ref<XQueryError> error) {
+  return std::make_unique<XQueryInternal>(std::move(error));
+}
+
+bool isLimited(const XQueryLimits& limits) {
+  return limits.duration || limits.deadline || limits.cancelled || limits.memoryCeiling;
+}
+
+Internal compiledWithin(const XQueryLimits& limits, const std::function<Internal()>& compile) {
+  XQueryLimitWatch watch(limits);
+  try {
+    watch.lookAtWork();
+    Internal query = compile();
+    watch.lookAtWork();
+    return query;
+  } catch (const NSException&) {
+    if (!watch.error()) throw;
+    return failed(watch.error());
+  } catch (const std::bad_alloc&) {
+    return failed(watch.allocationFailure().error());
+  }
+}
+
+// Without limits of its own a compilation that is part of an evaluation ends with that one.
+Internal compiled(const XQueryLimits& limits, const std::function<Internal()>& compile) {
+  if (isLimited(limits)) return compiledWithin(limits, compile);
+  try {
+    return compile();
+  } catch (const std::bad_alloc&) {
+    lookAtWork();
+    return failed(XQueryErrors::outOfMemory.error());
+  }
+}
+
+}  // namespace
 
 Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source) {
   return xqueryWithSource(source, XQueryLoading());
@@ -26,16 +67,29 @@ Ref<XQuery> XQuery::xqueryWithSource(std::string_view source) {
 }
 
 Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source, const XQueryLoading& loading) {
-  try {
-    return make<XQuery>(std::make_unique<XQueryInternal>(source, loading));
-  } catch (const std::bad_alloc&) {
-    return make<XQuery>(std::make_unique<XQueryInternal>(XQueryErrors::outOfMemory.error()));
-  }
+  return xqueryWithSource(source, loading, XQueryLimits());
 }
 
 Ref<XQuery> XQuery::xqueryWithSource(std::string_view source, const XQueryLoading& loading) {
-  if (const auto text = NSString::stringWithUTF8(source)) return xqueryWithSource(text, loading);
-  return make<XQuery>(std::make_unique<XQueryInternal>(XQueryErrors::notUTF8.error()));
+  return xqueryWithSource(source, loading, XQueryLimits());
+}
+
+Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source, const XQueryLoading& loading,
+                                     const XQueryLimits& limits) {
+  return make<XQuery>(compiled(limits, [&] {
+    if (!source) return failed(XQueryErrors::noSource.error());
+    return std::make_unique<XQueryInternal>(source, loading);
+  }));
+}
+
+// Making a string of the text is part of the work.
+Ref<XQuery> XQuery::xqueryWithSource(std::string_view source, const XQueryLoading& loading,
+                                     const XQueryLimits& limits) {
+  return make<XQuery>(compiled(limits, [&] {
+    const auto text = NSString::stringWithUTF8(source);
+    if (!text) return failed(XQueryErrors::notUTF8.error());
+    return std::make_unique<XQueryInternal>(text, loading);
+  }));
 }
 
 XQuery::XQuery(std::unique_ptr<XQueryInternal> internal)

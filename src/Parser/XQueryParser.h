@@ -7,6 +7,7 @@
 #pragma once
 
 #include "Parser/XQueryScanner.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryParsedModule.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
@@ -60,8 +61,12 @@ class XQueryParser : public NSCounted {
   void setResult(NSObject* module) { _result = module; }
   // The second declaration of one kind is an error at its line; an unknown flag is ignored.
   void XQueryParserSetSetterFlag(unsigned flag, int64_t line);
-  // Keeps the object alive until the parse ends.
-  void autorelease(Value object) { _pool.push_back(std::move(object)); }
+  // Keeps the object alive until the parse ends. One token may complete any number of expressions,
+  // so this is looked at as work.
+  void autorelease(Value object) {
+    checkWork();
+    _pool.push_back(std::move(object));
+  }
   // Memory that lives as long; null when there is none.
   void* allocate(size_t size);
 

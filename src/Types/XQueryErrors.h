@@ -61,6 +61,7 @@ inline constexpr XQueryErrorText<> rangeTooLong{0, "limit: range of too many ite
 
 // --- parsing -------------------------------------------------------------------------------------
 
+inline constexpr XQueryErrorText<> noSource{3, "there is no query text"};
 inline constexpr XQueryErrorText<> notUTF8{3, "the query is not well-formed UTF-8"};
 inline constexpr XQueryErrorText<2> scannerError{3, "%@ - %@"};
 inline constexpr XQueryErrorText<3> invalidToken{3, "%@ invalid token (%@)- %@"};
