@@ -1,9 +1,9 @@
 #include "Engine/XQueryInternal.h"
 
-#include "Prolog/XQueryParsedModule.h"
 #include "Parser/XQueryParser.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryModules.h"
+#include "Prolog/XQueryParsedModule.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
 
