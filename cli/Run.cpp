@@ -102,18 +102,14 @@ Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
   stop(StatusQueryError, text);
 }
 
-// Null for a query that has no value and no error, such as a library module.
+// Null for a query that has no value and no error, such as a library module. A value that is an
+// error counts as one wherever it stands, and then nothing is printed.
 Ref<NSArray> evaluate(XQueryContext& context, const XQuery& query, const XQueryConstants& constants,
                       const Value& contextItem) {
   Ref<XQueryError> error;
   Ref<NSArray> items = context.evaluateXQuery(query, constants, contextItem, &error);
-  if (error) stop(StatusQueryError, error->description()->utf8());
-  if (!items) return items;
-  // A value that is an error counts as one wherever it stands, and then nothing is printed.
-  for (const Value& item : items->objects()) {
-    if (isa<NSError>(item)) {
-      stop(StatusQueryError, cast<NSError>(item)->description()->utf8());
-    }
+  if (const Ref<NSError> failure = XQueryFirstError(items, error)) {
+    stop(StatusQueryError, failure->description()->utf8());
   }
   return items;
 }

@@ -102,15 +102,29 @@ class XQUERY_EXPORT XQueryClient {
                                       XQueryContext& context) = 0;
 };
 
-// The object against which queries are evaluated. It keeps, from one evaluation to the next, its
-// client, its namespaces, its loading settings, the documents it loaded, its last error and its
-// focus.
+// The object against which queries are evaluated. It keeps, from one evaluation to the next:
+//   - what the host gave it: client, namespaces, loading settings, limits
+//   - the context item, which stays in force for an evaluation that is given none
+//   - the clock: current-dateTime and its kin answer the moment at which the context was first
+//   asked
+//   - the documents that fn:doc loaded, and which URLs gave none: neither is fetched again
+//   - the base URIs recorded for constructed nodes, and its last error
+//
+// One context for many evaluations is right for one task over documents that do not change, such as
+// a query asked of each file of a folder. A context of its own for each evaluation is right where
+// evaluations must not learn of each other: the requests of a server, queries of different users,
+// a document that may appear or change between two evaluations, a clock that should go on. Making
+// one takes a microsecond, and the compiled query is shared all the same.
 //
 //   auto context = XQueryContext::xqueryContext();
 //   Ref<XQueryError> error;
 //   auto items = context->evaluateXQuery(*query, {{"limit", XQueryUntypedAtomic("10")}}, document,
 //                                        &error);
-//   if (!items) report(error ? error->description()->utf8() : "no value");
+//   if (const auto failure = XQueryFirstError(items, error)) {
+//     report(failure->description()->utf8());
+//   } else if (items) {
+//     for (const Value& item : items->objects()) use(XQueryItemStringValue(*item));
+//   }
 class XQUERY_EXPORT XQueryContext : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Context; }
@@ -130,8 +144,11 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   // keeps its whole tree alive. When constructors recorded a base URI and the first item is an
   // element or a document, that element is given an xml:base attribute unless it has one.
   //
-  // Null on error and when there is no value at all (an empty query, a library module). `*error`,
-  // when `error` is not null, is set to null first and on failure to the error: the first one of a
+  // Null on error, and without an error when there is no value at all (an empty query, a library
+  // module). A value may be an error too, such as what stands for the malformed `<!-- a -- b -->`:
+  // as the first item of a result it is handed back as the error, behind others it stays among the
+  // items, and the evaluation succeeds. XQueryFirstError finds either. `*error`, when `error` is
+  // not null, is set to null first and on failure to the error: the first one of a
   // query that failed to compile, 16 "unresloved external variable - name" or "unresloved external
   // function - name", 0 and a text that begins with "limit: " when a limit of the context was
   // reached or the engine ran out of stack, memory or digits, or what an expression raised.
@@ -174,13 +191,19 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   std::unique_ptr<XQueryContextInternal> _private;
 };
 
-// --- looking at result items ---------------------------------------------------------------------
+// --- looking at results --------------------------------------------------------------------------
+
+// Whether a result failed: the error that its evaluation gave back or, when there is none, the
+// first item that is an error. Null when there is neither, and for a result that is null as well.
+[[nodiscard]] XQUERY_EXPORT Ref<NSError> XQueryFirstError(const Ref<NSArray>& items,
+                                                          const Ref<XQueryError>& error = nullptr);
 
 // The item's type as a query would write it: "xs:integer", "xdt:untypedAtomic", "element()",
 // "attribute()", "text()", "comment()", "processing-instruction()", "document-node()",
-// "namespace()", or "item()" for an item without a type.
+// "namespace()", or "item()" for an item without a type, such as raw data or an error.
 XQUERY_EXPORT std::string XQueryItemTypeName(const NSObject& item);
-// The item's string value (a node's text, an atomic value's canonical form), as UTF-8.
+// The item's string value as UTF-8: a node's text, an atomic value's canonical form, the
+// hexadecimal digits of raw data, an error's description.
 XQUERY_EXPORT std::string XQueryItemStringValue(const NSObject& item);
 // An xdt:untypedAtomic value, as the command line binds its variables. Null when the text is not
 // UTF-8.

@@ -1,4 +1,4 @@
-// The public questions about a result item.
+// The public questions about a result and its items.
 #include "Types/XQueryBinary.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryQName.h"
@@ -6,7 +6,17 @@
 #include "Types/XQueryValues.h"
 #include "xquery/XQuery.h"
 
+#include <algorithm>
+
 namespace xquery {
+
+Ref<NSError> XQueryFirstError(const Ref<NSArray>& items, const Ref<XQueryError>& error) {
+  if (error || !items) return error;
+  const auto& objects = items->objects();
+  const auto found = std::find_if(objects.begin(), objects.end(),
+                                  [](const Value& item) { return isa<NSError>(item); });
+  return found == objects.end() ? nullptr : cast<NSError>(*found);
+}
 
 std::string XQueryItemTypeName(const NSObject& item) {
   switch (item.kind()) {

@@ -41,6 +41,23 @@ TEST(Readme, TheExampleReportsADocumentThatIsNotThere) {
   EXPECT_NE(outcome.err.find("/nowhere.xml: "), std::string::npos);
 }
 
+TEST(Readme, TheExamplePrintsNothingForAnEmptyQuery) {
+  for (const char* query : {"", "()", "(: nothing :)", "module namespace m = 'urn:m';"}) {
+    const Outcome outcome = command::start("xquery_embed", {books(), query});
+    EXPECT_EQ(outcome.status, 0) << query;
+    EXPECT_EQ(outcome.out + outcome.err, "") << query;
+  }
+}
+
+TEST(Readme, TheExampleReportsAnErrorWhereverItStands) {
+  for (const char* query : {"//book[", "1 idiv 0", "<!-- a -- b -->", "(1, <!-- a -- b -->, 2)"}) {
+    const Outcome outcome = command::start("xquery_embed", {books(), query});
+    EXPECT_EQ(outcome.status, 1) << query;
+    EXPECT_EQ(outcome.out, "") << query;
+    EXPECT_EQ(outcome.err.find("XQueryError:"), 0U) << query;
+  }
+}
+
 // Every line of the README that starts the built command, run by a shell in the project's folder.
 TEST(Readme, ItsCommandLinesSucceed) {
   std::istringstream readme(readFile(XQUERY_SOURCE_DIR "/README.md"));
