@@ -1,10 +1,10 @@
 #include "Options.h"
 
 #include "Output.h"
+#include "Streams.h"
 
 #include <CLI/CLI.hpp>
 
-#include <iostream>
 #include <memory>
 #include <sstream>
 
@@ -101,7 +101,7 @@ Status print(const CLI::App& app, const CLI::Success& request) {
   if (output.open(std::nullopt) && output.append(text.str()) && output.finish()) {
     return StatusResult;
   }
-  std::cerr << "xquery: cannot write standard output: " << output.error() << '\n';
+  writeMessage("xquery: cannot write standard output: " + output.error() + "\n");
   return StatusInput;
 }
 
@@ -117,7 +117,7 @@ std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
   } catch (const CLI::Success& success) {
     return print(app, success);
   } catch (const CLI::ParseError& error) {
-    std::cerr << "xquery: " << error.what() << "\nTry xquery --help.\n";
+    writeMessage("xquery: " + std::string(error.what()) + "\nTry xquery --help.\n");
     return StatusUsage;
   }
   return std::nullopt;

@@ -1,6 +1,7 @@
 #include "Run.h"
 
 #include "Output.h"
+#include "Streams.h"
 #include "Timing.h"
 #include "xquery/xquery.h"
 
@@ -21,9 +22,7 @@ struct Stop {
 };
 
 [[noreturn]] void stop(Status status, const std::string& message) {
-  // A message may quote any character of the query, a zero included.
-  std::fwrite(message.data(), 1, message.size(), stderr);
-  std::fputc('\n', stderr);
+  writeMessage(message + "\n");
   throw Stop{status};
 }
 
@@ -184,7 +183,7 @@ Status run(const Options& options) {
   } catch (const Stop& end) {
     return end.status;
   } catch (const std::exception& error) {
-    std::fprintf(stderr, "xquery: %s\n", error.what());
+    writeMessage("xquery: " + std::string(error.what()) + "\n");
     return StatusInput;
   }
 }

@@ -1,5 +1,7 @@
 #include "Timing.h"
 
+#include "Streams.h"
+
 #include <algorithm>
 #include <cstdio>
 
@@ -25,7 +27,7 @@ std::string Phase::report(bool statistics) const {
 
 void Phases::report(bool statistics) const {
   for (const Phase* phase : {&parse, &compile, &evaluate, &print}) {
-    std::fputs(phase->report(statistics).c_str(), stderr);
+    writeMessage(phase->report(statistics));
   }
 }
 

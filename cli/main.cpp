@@ -9,13 +9,12 @@
 // thread that finds none when its stack grows is killed.
 #include "Options.h"
 #include "Run.h"
+#include "Streams.h"
 
 #include <algorithm>
 #include <cstddef>
-#include <cstdio>
 #include <filesystem>
 #include <pthread.h>
-#include <signal.h>
 #include <sys/auxv.h>
 #include <sys/resource.h>
 #include <system_error>
@@ -92,15 +91,14 @@ int main(int argc, char** argv) {
   const bool isBounded = addressSpace() != RLIM_INFINITY;
   const bool usesMainStack = !isBounded && hasLargeStack();
   if (!isBounded && !usesMainStack) restartWithLargeStack(argv);
-  // A reader that goes away is a failed write like any other, to be reported and not to die of.
-  signal(SIGPIPE, SIG_IGN);
+  cli::prepareStandardStreams();
   cli::Options options;
   if (const auto status = cli::parseOptions(argc, argv, options)) return *status;
   Job job{options};
   if (usesMainStack) {
     runJob(&job);
   } else if (!runOnThread(job)) {
-    std::fprintf(stderr, "xquery: cannot start a thread\n");
+    cli::writeMessage("xquery: cannot start a thread\n");
   }
   return job.status;
 }

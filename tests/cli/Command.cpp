@@ -46,11 +46,11 @@ int closedPipe() {
   return ends[1];
 }
 
-int openOutput(StandardOutput kind, const std::string& captured) {
+int openOutput(Sink kind, const std::string& captured) {
   switch (kind) {
-    case StandardOutput::ClosedPipe:
+    case Sink::ClosedPipe:
       return closedPipe();
-    case StandardOutput::FullDevice:
+    case Sink::FullDevice:
       return openFile("/dev/full", O_WRONLY);
     default:
       return openFile(captured, O_WRONLY | O_CREAT);
@@ -60,12 +60,12 @@ int openOutput(StandardOutput kind, const std::string& captured) {
 }  // namespace
 
 Outcome start(const std::string& program, const std::vector<std::string>& arguments,
-              const std::string& input, StandardOutput standardOutput) {
+              const std::string& input, Sink standardOutput, Sink standardError) {
   const TemporaryDirectory directory;
   const std::string out = directory.path("out"), err = directory.path("err");
   const int inFile = openFile(directory.write("in", input), O_RDONLY);
   const int outFile = openOutput(standardOutput, out);
-  const int errFile = openFile(err, O_WRONLY | O_CREAT);
+  const int errFile = openOutput(standardError, err);
   const pid_t child = fork();
   if (child == 0) {
     const bool own = program.find('/') == std::string::npos;
@@ -84,6 +84,12 @@ Outcome start(const std::string& program, const std::vector<std::string>& argume
 
 Outcome xquery(const std::vector<std::string>& arguments, const std::string& input) {
   return start("xquery", arguments, input);
+}
+
+Outcome shell(const std::string& script, const std::vector<std::string>& arguments) {
+  std::vector<std::string> all{"-c", script, XQUERY_BINARY_DIR "/xquery"};
+  all.insert(all.end(), arguments.begin(), arguments.end());
+  return start("/bin/sh", all);
 }
 
 TemporaryDirectory::TemporaryDirectory() {

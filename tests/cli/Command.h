@@ -13,16 +13,20 @@ struct Outcome {
   std::string err;
 };
 
-enum class StandardOutput { Captured, ClosedPipe, FullDevice };
+// Where a program's output goes.
+enum class Sink { Captured, ClosedPipe, FullDevice };
 
 // Starts a program, of the build directory when its name has no slash, with `input` as its standard
 // input.
 Outcome start(const std::string& program, const std::vector<std::string>& arguments,
-              const std::string& input = "",
-              StandardOutput standardOutput = StandardOutput::Captured);
+              const std::string& input = "", Sink standardOutput = Sink::Captured,
+              Sink standardError = Sink::Captured);
 
 // The xquery command.
 Outcome xquery(const std::vector<std::string>& arguments, const std::string& input = "");
+
+// A shell runs `script`, in which "$0" is the xquery command and "$1" and so on are the arguments.
+Outcome shell(const std::string& script, const std::vector<std::string>& arguments = {});
 
 // A directory of its own for each object, removed with it.
 class TemporaryDirectory {

@@ -121,13 +121,6 @@ TEST(Options, OutputGoesToAFile) {
   EXPECT_EQ(readFile(file), "1\n2\n");
 }
 
-TEST(Options, AQueryErrorLeavesTheOutputFileAlone) {
-  const TemporaryDirectory directory;
-  const std::string file = directory.write("out", "kept");
-  EXPECT_EQ(xquery({"-o", file, "-e", "1 div 0"}).status, 1);
-  EXPECT_EQ(readFile(file), "kept");
-}
-
 TEST(Options, TimeReportsEachPhaseOnStandardError) {
   const Outcome outcome = xquery({"--time", "-e", "1"});
   EXPECT_EQ(outcome.status, 0);

@@ -1,0 +1,54 @@
+#include "Streams.h"
+
+#include <cerrno>
+#include <csignal>
+#include <fcntl.h>
+#include <poll.h>
+#include <pthread.h>
+#include <unistd.h>
+
+namespace cli {
+
+void prepareStandardStreams() {
+  for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
+    if (fcntl(stream, F_GETFD) >= 0) continue;
+    // The lowest free number is the stream's own.
+    const int file = open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY);
+    if (file > STDERR_FILENO) close(file);
+  }
+  std::signal(SIGPIPE, SIG_IGN);
+  std::signal(SIGXFSZ, SIG_IGN);
+}
+
+void endOfClosedPipe() {
+  std::signal(SIGPIPE, SIG_DFL);
+  sigset_t closedPipe;
+  sigemptyset(&closedPipe);
+  sigaddset(&closedPipe, SIGPIPE);
+  pthread_sigmask(SIG_UNBLOCK, &closedPipe, nullptr);
+  raise(SIGPIPE);
+  _exit(128 + SIGPIPE);
+}
+
+bool writeAll(int file, std::string_view text) {
+  while (!text.empty()) {
+    const ssize_t count = write(file, text.data(), text.size());
+    if (count >= 0) {
+      text.remove_prefix(static_cast<size_t>(count));
+    } else if (errno == EPIPE) {
+      endOfClosedPipe();
+    } else if (errno == EAGAIN) {
+      pollfd writable{file, POLLOUT, 0};
+      poll(&writable, 1, -1);
+    } else if (errno != EINTR) {
+      return false;
+    }
+  }
+  return true;
+}
+
+void writeMessage(std::string_view text) {
+  if (!writeAll(STDERR_FILENO, text)) return;
+}
+
+}  // namespace cli

@@ -1,0 +1,24 @@
+// The standard streams of the command.
+#pragma once
+
+#include <string_view>
+
+namespace cli {
+
+// Called once, before anything is opened: a stream that was closed gets a place that fails to be
+// read or written, so that no file of the command's own takes its number and hears its messages.
+// From then on a reader that has gone away and a file that grows too large are failed writes.
+void prepareStandardStreams();
+
+// Writes all of the text. A reader that has gone away ends the process; false, with errno, for any
+// other failure.
+[[nodiscard]] bool writeAll(int file, std::string_view text);
+
+// Ends the process as the signal of a closed pipe does, which is what a shell expects of a command
+// whose reader had enough; without a message.
+[[noreturn]] void endOfClosedPipe();
+
+// Writes to standard error; what cannot be written there cannot be reported anywhere.
+void writeMessage(std::string_view text);
+
+}  // namespace cli
