@@ -173,7 +173,9 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
   uint32_t orderNumber() const { return _word; }
 
   // --- changes ----------------------------------------------------------------------------------
-  void setStringValue(NSStringView text);     // own text; for an element replaces the children
+  // Sets the own text; replaces the children of an element. A comment that stands in a query as it
+  // is stays what it is.
+  void setStringValue(NSStringView text);
   void detach();                              // becomes a root of its own
   [[nodiscard]] Ref<NSXMLNode> copy() const;  // deep copy in a new tree, without parent
 

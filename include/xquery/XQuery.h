@@ -142,7 +142,9 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   // Evaluates and answers an array of items: nodes of the input tree, new nodes, atomic values. The
   // empty sequence is an empty array. The array and its items are the caller's to keep; a node
   // keeps its whole tree alive. When constructors recorded a base URI and the first item is an
-  // element or a document, that element is given an xml:base attribute unless it has one.
+  // element or a document made by this evaluation, that element is given an xml:base attribute
+  // unless it has one. Nodes that were there before are not changed, so that other threads may read
+  // them meanwhile: constructors take in copies of them.
   //
   // Null on error, and without an error when there is no value at all (an empty query, a library
   // module). A value may be an error too, such as what stands for the malformed `<!-- a -- b -->`:

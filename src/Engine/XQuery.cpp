@@ -7,6 +7,7 @@
 #include "Engine/XQueryInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/NSLog.h"
+#include "Platform/Tree/Arena.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryValues.h"
@@ -161,12 +162,13 @@ void XQueryContext::_traceValue(const Value& value, const Ref<NSString>& forLabe
 
 namespace {
 
-// Marks the first result with the base URI that its construction recorded.
+// Marks the first result with the base URI that its construction recorded. What was there before
+// the evaluation stays as it is.
 void decorateWithBaseURI(const NSArray& items, const XQueryContextInternal& context) {
   NSObject* first = items.objectAtIndex(0);
   if (const auto* document = dyn_cast<NSXMLDocument>(first)) first = document->rootElement();
   auto* element = dyn_cast<NSXMLElement>(first);
-  if (!element) return;
+  if (!element || !NSXMLTree::isNew(element)) return;
   const NSStringView name = NSStringView::ascii("xml:base");
   const Ref<NSString> URI = context.baseURIForNode(element);
   const bool isEmpty = !URI || URI->length() == 0;
@@ -193,6 +195,7 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   if (error) *error = nullptr;
   if (compiled.isError()) return shapedResult(query.parseErrors(), error);
 
+  const NSXMLEra era;
   context._clearGlobals();
   context.keptValues().clear();
   if (contextItem && !isNull(contextItem)) context.setContextItem(contextItem, 1);

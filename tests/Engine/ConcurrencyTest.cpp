@@ -41,6 +41,8 @@ constexpr Work works[] = {
     {"BaseURIs",
      "declare base-uri 'http://example.org/base/'; <a><b>{for $i in 1 to 30 return <c>{$i}</c>}"
      "</b></a>"},
+    {"BaseURIsAndTheDocument",
+     "declare base-uri 'http://example.org/base/'; (//book[2], <a/>, base-uri(//book[3]))"},
     {"Sorting",
      "for $b in //book let $p := $b/price order by xs:decimal($p) descending, $b/title "
      "return string($b/@id)"},
@@ -112,8 +114,8 @@ TEST(Concurrency, ContextsLastOverManyQueries) {
         const auto context = XQueryContext::xqueryContextWithNamespaces({{"late", "urn:late"}});
         for (size_t i = 0; i < queries.size(); ++i) {
           const size_t which = (i + static_cast<size_t>(thread) * 3) % queries.size();
-          // A context that has recorded a base URI marks the first element of every result.
-          if (std::string_view(works[which].name) == "BaseURIs") continue;
+          // A context that has recorded a base URI marks the first new element of every result.
+          if (std::string_view(works[which].name).starts_with("BaseURIs")) continue;
           Ref<XQueryError> error;
           const auto items = context->evaluateXQuery(*queries[which], {}, document, &error);
           if (printed(items, error) != expected[which]) complaints.add(works[which].name);
@@ -134,6 +136,47 @@ TEST(Concurrency, ConstantsAreShared) {
   EXPECT_EQ(together([&](int, Complaints& complaints) {
               for (int i = 0; i < evaluations; ++i) {
                 const std::string found = evaluated(*query, nullptr, constants);
+                if (found != expected) complaints.add(found);
+              }
+            }),
+            none);
+}
+
+// Without a parent they could become part of what is constructed.
+TEST(Concurrency, ConstantNodesAreShared) {
+  const auto query = XQuery::xqueryWithSource(
+      "declare base-uri 'http://example.org/'; declare variable $n external; "
+      "let $e := <e>{$n}</e> return ($n, $e, <f>{$n, $n[1]}</f>, document {$n[1]}, "
+      "$e//m, count($n/ancestor-or-self::node()), <g>{.}</g>)");
+  const auto element = NSXMLElement::elementWithName(NSStringView::ascii("n"));
+  element->addChild(NSXMLElement::elementWithName(NSStringView::ascii("m")));
+  const Ref<NSXMLNode> comment = NSXMLNode::commentWithStringValue(NSStringView::ascii("c"));
+  const XQueryConstants constants = {{"n", NSArray::arrayWithObjects({element, comment})}};
+  const std::string expected = evaluated(*query, element->copy(), constants);
+  EXPECT_EQ(expected.find("error"), std::string::npos) << expected;
+  EXPECT_EQ(together([&](int, Complaints& complaints) {
+              for (int i = 0; i < rounds; ++i) {
+                const std::string found = evaluated(*query, element, constants);
+                if (found != expected) complaints.add(found);
+              }
+            }),
+            none);
+  EXPECT_FALSE(element->parent());
+  EXPECT_EQ(element->XMLString()->utf8(), "<n><m/></n>");
+}
+
+// One comment for all threads.
+TEST(Concurrency, ConstantCommentsAreShared) {
+  const auto query = XQuery::xqueryWithSource(
+      "declare function local:c() { <!--c--> }; "
+      "let $e := <e>{local:c(), local:c()}</e> return ($e, $e/comment(), local:c(), "
+      "document {local:c()}, local:c() is local:c(), empty(local:c()/..), local:c() << "
+      "$e/comment())");
+  const std::string expected = evaluated(*query, nullptr);
+  EXPECT_EQ(expected.find("error"), std::string::npos) << expected;
+  EXPECT_EQ(together([&](int, Complaints& complaints) {
+              for (int i = 0; i < rounds; ++i) {
+                const std::string found = evaluated(*query, nullptr);
                 if (found != expected) complaints.add(found);
               }
             }),

@@ -378,33 +378,47 @@ TEST_F(Driver, WithLoggingOnErrorsStillReachTheCaller) {
 }
 
 TEST_F(Driver, FirstElementIsDecoratedWithItsRecordedBaseURI) {
-  const auto element = NSXMLElement::elementWithName(NSStringView::ascii("a"));
-  context->_internal().setBaseURI(text("http://base/"), element.get());
-  EXPECT_TRUE(evaluateLiteral(Value(element.get())));
+  Ref<NSXMLElement> element;
+  evaluateBody([&](XQueryContextInternal& internal) -> Value {
+    element = NSXMLElement::elementWithName(NSStringView::ascii("a"));
+    internal.setBaseURI(text("http://base/"), element.get());
+    return element;
+  });
   EXPECT_EQ(element->XMLString()->utf8(), "<a xml:base=\"http://base/\"/>");
 }
 
 TEST_F(Driver, ADocumentsRootElementIsDecorated) {
-  const auto document = NSXMLDocument::documentWithData("<a/>", 0);
-  context->_internal().setBaseURI(text("http://base/"), document->rootElement());
-  EXPECT_TRUE(evaluateLiteral(Value(document.get())));
+  Ref<NSXMLDocument> document;
+  evaluateBody([&](XQueryContextInternal& internal) -> Value {
+    document = NSXMLDocument::document();
+    document->addChild(NSXMLElement::elementWithName(NSStringView::ascii("a")));
+    internal.setBaseURI(text("http://base/"), document->rootElement());
+    return document;
+  });
   EXPECT_EQ(document->rootElement()->XMLString()->utf8(), "<a xml:base=\"http://base/\"/>");
 }
 
 TEST_F(Driver, ElementWithoutARecordedURIGetsAnEmptyOne) {
   const auto recorded = NSXMLElement::elementWithName(NSStringView::ascii("r"));
   context->_internal().setBaseURI(text("http://base/"), recorded.get());
-  const auto element = NSXMLElement::elementWithName(NSStringView::ascii("a"));
-  EXPECT_TRUE(evaluateLiteral(Value(element.get())));
+  Ref<NSXMLElement> element;
+  evaluateBody([&](XQueryContextInternal&) -> Value {
+    element = NSXMLElement::elementWithName(NSStringView::ascii("a"));
+    return element;
+  });
   EXPECT_EQ(element->XMLString()->utf8(), "<a xml:base=\"\"/>");
 }
 
 TEST_F(Driver, AnExistingBaseIsNotReplaced) {
-  const auto document = NSXMLDocument::documentWithData("<a xml:base='http://own/'/>", 0);
-  const auto other = NSXMLElement::elementWithName(NSStringView::ascii("o"));
-  context->_internal().setBaseURI(text("http://base/"), other.get());
-  EXPECT_TRUE(evaluateLiteral(Value(document.get())));
-  EXPECT_EQ(document->rootElement()->XMLString()->utf8(), "<a xml:base=\"http://own/\"/>");
+  Ref<NSXMLElement> element;
+  evaluateBody([&](XQueryContextInternal& internal) -> Value {
+    element = NSXMLElement::elementWithName(NSStringView::ascii("a"));
+    element->addAttribute(NSXMLNode::attributeWithName(NSStringView::ascii("xml:base"),
+                                                       NSStringView::ascii("http://own/")));
+    internal.setBaseURI(text("http://base/"), element.get());
+    return element;
+  });
+  EXPECT_EQ(element->XMLString()->utf8(), "<a xml:base=\"http://own/\"/>");
 }
 
 TEST_F(Driver, OtherFirstItemsAreNotDecorated) {

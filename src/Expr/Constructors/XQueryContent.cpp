@@ -92,8 +92,8 @@ void XQueryContent::flushText() {
   _text.clear();
 }
 
-Ref<NSXMLNode> XQueryContent::adoptable(NSXMLNode& node) {
-  return node.parent() || NSXMLTree::isFixed(&node) ? node.copy() : Ref<NSXMLNode>(&node);
+Ref<NSXMLNode> XQueryContent::adoptable(NSXMLNode& node) const {
+  return NSXMLTree::mayMoveTo(&_parent, &node) ? Ref<NSXMLNode>(&node) : node.copy();
 }
 
 void XQueryContent::insert(NSXMLNode& child) {
@@ -144,11 +144,12 @@ bool XQueryElementContent::isNewName(const NSXMLExpandedName* name) {
 }
 
 // Attributes that differ in their expanded names are all kept, should their prefixes be the same.
+// One without a prefix has nothing to declare: the default namespace is none of attributes.
 void XQueryElementContent::prepareForAttribute(const NSXMLName& name) {
   if (!isNewName(name.expanded)) {
     _context._internal().raise(XQueryErrors::attributeNotDistinct.errorAtLine(_line));
   }
-  _namespaces.updateNamespacesForElement(element(), name);
+  if (name.prefixLength > 0) _namespaces.updateNamespacesForElement(element(), name);
 }
 
 void XQueryElementContent::append(NSXMLNode* attribute) {

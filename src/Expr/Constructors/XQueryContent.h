@@ -1,8 +1,9 @@
 // The content of a constructed element or document.
 //
 // A constructor evaluates its content items one by one and hands each value to a collector, which
-// walks it: text and atomic values gather in a buffer that becomes one text node, nodes without a
-// parent become children as they are, and nodes that have one are copied.
+// walks it: text and atomic values gather in a buffer that becomes one text node, and nodes become
+// children as they are or as copies. A copy is made of a node that has a parent, that was there
+// before the evaluation (others may be using it), or that would come to lie below itself.
 #pragma once
 
 #include "Platform/Tree/Arena.h"
@@ -47,7 +48,7 @@ class XQueryContent {
   void appendText(NSStringView text) { _text.append(text); }
   void flushText();
   // The node itself where it may be moved, else a copy.
-  static Ref<NSXMLNode> adoptable(NSXMLNode& node);
+  Ref<NSXMLNode> adoptable(NSXMLNode& node) const;
   // Flushes the text before it.
   void addChild(NSXMLNode& node);
   void insert(NSXMLNode& child);

@@ -144,6 +144,7 @@ class TreeHandler final : public LibXMLHandler {
         _keepsCDATA((options & NSXMLNodePreserveCDATA) != 0),
         _builder(std::max(expectedBytes, size_t{256}), std::max(expectedBytes / 2, size_t{128})),
         _names(_builder.tree()) {
+    _builder.tree().becomeOld();
     _builder.openDocument();
   }
 

@@ -315,6 +315,7 @@ class Importer {
 };
 
 NSXMLDocument* Importer::run() {
+  _builder.tree().becomeOld();
   _builder.openDocument();
   WorkPacer pacer;
   const xmlNode* node = _document.children;

@@ -6,11 +6,13 @@
 #include "Platform/Tree/TreeExtra.h"
 
 #include <algorithm>
+#include <atomic>
 #include <cstdlib>
 #include <limits>
 #include <malloc.h>
 #include <mutex>
 #include <new>
+#include <utility>
 
 namespace xquery {
 
@@ -79,6 +81,29 @@ std::mutex& orderLock(const NSXMLTree* tree) {
 }
 
 }  // namespace
+
+// --- eras ------------------------------------------------------------------------------------
+
+namespace {
+
+constinit thread_local uint64_t currentEra __attribute__((tls_model("initial-exec"))) = 0;
+
+uint64_t nextEra() {
+  static std::atomic<uint64_t> last = 0;
+  return last.fetch_add(1, std::memory_order_relaxed) + 1;
+}
+
+}  // namespace
+
+NSXMLEra::NSXMLEra() : _around(std::exchange(currentEra, nextEra())) {}
+
+NSXMLEra::~NSXMLEra() {
+  currentEra = _around;
+}
+
+uint64_t NSXMLEra::current() {
+  return currentEra;
+}
 
 // --- life ------------------------------------------------------------------------------------
 
@@ -414,6 +439,7 @@ void NSXMLTree::absorb(NSXMLTree* smaller) {
   setNextBlock(_lastBlock, nextBlock(smaller->_lastBlock));
   setNextBlock(smaller->_lastBlock, first);
   setBlockCount(uint64_t{blockCount()} + smaller->blockCount());
+  _era = std::min(_era, smaller->_era);
   const uint64_t sum = uint64_t{references} + smaller->references;
   references = sum >= immortalBit ? immortalBit : static_cast<uint32_t>(sum);
   NSCounted::operator delete(smaller, sizeof(NSXMLTree));
@@ -466,12 +492,16 @@ void prepareToJoin(NSXMLTree* parents, NSXMLTree* childs) {
 
 }  // namespace
 
+bool NSXMLTree::isRootAbove(const NSXMLNode* node, const NSXMLNode* root) {
+  return of(node) == of(root) && node->rootNode() == root;
+}
+
 bool NSXMLTree::adoptChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before) {
   if (!child || child->_parent || child->isProperty() || child->kind() == Kind::Document ||
       isFixed(child)) {
     return false;
   }
-  if (of(parent) == of(child) && parent->rootNode() == child) return false;
+  if (isRootAbove(parent, child)) return false;
   insertChild(parent, child, before);
   return true;
 }

@@ -1,10 +1,11 @@
 // The arena of a tree.
 //
-//   NSXMLTree (32 bytes)        block of one node           bulk node block       text block
+//   NSXMLTree (40 bytes)        block of one node           bulk node block       text block
 //     count, order, blocks        head: tree, next            head, end             head
 //     last block ---------------> node                        node node node ...    text text ...
 //     names, cursors              [its text]
 //     base URIs on record
+//     era
 //
 // The blocks of a tree form a ring (the tree knows the last, whose next is the first). The head of
 // a block names the tree; a node knows how far it is from the head of its block. So merging two
@@ -41,6 +42,25 @@ class NSXMLProcessingInstruction : public NSXMLNode {
 struct NSXMLTreeExtra;
 struct NSXMLNameList;
 
+// A stretch of a thread's work in which the trees that it makes can be told from those that were
+// there before: an evaluation may change the former and must leave the latter as they are, since
+// other threads may be reading them. Eras of a thread nest. Those that begin later, here or in
+// another thread, have higher numbers, so that what is made in an inner era is also new to the
+// outer one when that goes on.
+class NSXMLEra {
+ public:
+  NSXMLEra();
+  ~NSXMLEra();
+  NSXMLEra(const NSXMLEra&) = delete;
+  NSXMLEra& operator=(const NSXMLEra&) = delete;
+
+  // The number of the thread's innermost era; 0, before all others, outside of any.
+  static uint64_t current();
+
+ private:
+  const uint64_t _around;
+};
+
 // Room behind an element made singly for the attributes and texts that it gets next, so that a
 // small element is one block. Belongs to whoever makes the element.
 class NSXMLRoom {
@@ -70,6 +90,12 @@ class NSXMLTree : public NSXMLTreeHead {
   // destroys it.
   [[nodiscard]] static NSXMLTree* create();
   void destroy();
+
+  // Whether the node's tree was made in the era in force, as a whole. Outside of any era every tree
+  // counts as made in it.
+  static bool isNew(const NSXMLNode* node) { return of(node)->_era >= NSXMLEra::current(); }
+  // For what is read and not constructed: from now on the tree counts as made before all eras.
+  void becomeOld() { _era = 0; }
 
   void retain();
   void release();
@@ -136,6 +162,11 @@ class NSXMLTree : public NSXMLTreeHead {
   // Links what may become a child of `parent`: a parentless node that is neither a document nor an
   // attribute nor a namespace nor the root above `parent`. Answer: whether it did.
   static bool adoptChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before);
+  // Whether a constructor that makes `parent` may put the node itself there and not a copy: a root
+  // that was made in this era, belongs to nobody else, and is not above `parent`.
+  static bool mayMoveTo(const NSXMLNode* parent, const NSXMLNode* node) {
+    return !node->_parent && !isFixed(node) && isNew(node) && !isRootAbove(parent, node);
+  }
   // The rest leaves checks to the caller.
   // Links a parentless node, moving its tree into this one. `before` is null to append.
   static void insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before);
@@ -178,7 +209,7 @@ class NSXMLTree : public NSXMLTreeHead {
   static void setOrderNumber(NSXMLNode* node, uint32_t number) { node->_word = number; }
   static void setCDATA(NSXMLNode* node) { node->_flags |= NSXMLNode::CDATA; }
   static bool isCDATA(const NSXMLNode* node) { return (node->_flags & NSXMLNode::CDATA) != 0; }
-  // A fixed node is never adopted: several threads may be using it.
+  // A fixed node is never adopted nor changed: several threads may be using it.
   static void setFixed(NSXMLNode* node) { node->_flags |= NSXMLNode::Fixed; }
   static bool isFixed(const NSXMLNode* node) { return (node->_flags & NSXMLNode::Fixed) != 0; }
 
@@ -215,6 +246,8 @@ class NSXMLTree : public NSXMLTreeHead {
   template <class Function>
   void forEachName(Function function) const;
 
+  // Whether the parentless node is the other node or an ancestor of it.
+  static bool isRootAbove(const NSXMLNode* node, const NSXMLNode* root);
   static void merge(NSXMLTree* a, NSXMLTree* b);
   void absorb(NSXMLTree* smaller);
   void absorbExtra(NSXMLTree* smaller);
@@ -238,9 +271,10 @@ class NSXMLTree : public NSXMLTreeHead {
   static constexpr uintptr_t tagBits = 3;
   uintptr_t _extra = 0;
   NSXMLBaseURI* _baseURIs = nullptr;
+  uint64_t _era = NSXMLEra::current();  // in which it was made; of merged trees the older one's
 };
 
-static_assert(sizeof(NSXMLTree) == 32 && sizeof(NSXMLBaseURI) == 32);
+static_assert(sizeof(NSXMLTree) == 40 && sizeof(NSXMLBaseURI) == 32);
 
 // The time in which a constructor fills a new node, the root of its tree.
 class NSXMLUnfinished {

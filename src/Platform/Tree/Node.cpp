@@ -178,6 +178,7 @@ void NSXMLNode::appendStringValueTo(NSMutableString& out) const {
 // --- changes ---------------------------------------------------------------------------------
 
 void NSXMLNode::setStringValue(NSStringView text) {
+  if (NSXMLTree::isFixed(this)) return;
   if (!isBranch()) {
     NSXMLTree::noteTextChange(this);
     tree()->setText(this, text);

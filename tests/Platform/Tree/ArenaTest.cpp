@@ -102,6 +102,52 @@ TEST(XMLTree, AStringTakenFromATreeKeepsIt) {
   EXPECT_EQ(text->utf8(), "a text that is too long to be copied into a string");
 }
 
+TEST(XMLTree, WhatWasMadeBeforeAnEraIsNotNewInIt) {
+  const auto outside = NSXMLElement::elementWithName(A("a"));
+  EXPECT_TRUE(NSXMLTree::isNew(outside.get())) << "outside of any era";
+  Ref<NSXMLNode> made;
+  {
+    const NSXMLEra era;
+    EXPECT_FALSE(NSXMLTree::isNew(outside.get()));
+    made = NSXMLNode::textWithStringValue(A("t"));
+    EXPECT_TRUE(NSXMLTree::isNew(made.get()));
+    EXPECT_TRUE(NSXMLTree::isNew(outside->copy().get()));
+    const auto read = parsed("<a/>");
+    EXPECT_FALSE(NSXMLTree::isNew(read.get())) << "read, not made";
+    {
+      const NSXMLEra inner;
+      EXPECT_FALSE(NSXMLTree::isNew(made.get()));
+      made = NSXMLNode::textWithStringValue(A("u"));
+    }
+    EXPECT_TRUE(NSXMLTree::isNew(made.get())) << "made in an era inside";
+  }
+  const NSXMLEra later;
+  EXPECT_FALSE(NSXMLTree::isNew(made.get()));
+}
+
+TEST(XMLTree, AMergedTreeIsAsOldAsItsOldestPart) {
+  const auto old = NSXMLElement::elementWithName(A("a"));
+  const NSXMLEra era;
+  const auto parent = NSXMLElement::elementWithName(A("p"));
+  EXPECT_TRUE(NSXMLTree::mayMoveTo(parent.get(), NSXMLElement::elementWithName(A("c")).get()));
+  EXPECT_FALSE(NSXMLTree::mayMoveTo(parent.get(), old.get()));
+  EXPECT_TRUE(parent->addChild(old));
+  EXPECT_FALSE(NSXMLTree::isNew(parent.get()));
+}
+
+TEST(XMLTree, ANodeIsNeverAddedBelowItself) {
+  const auto a = NSXMLElement::elementWithName(A("a"));
+  const auto b = NSXMLElement::elementWithName(A("b"));
+  EXPECT_FALSE(a->addChild(a));
+  EXPECT_TRUE(a->addChild(b));
+  EXPECT_FALSE(b->addChild(a));
+  EXPECT_FALSE(b->insertChild(a, 0));
+  EXPECT_FALSE(b->addChild(b)) << "it has a parent";
+  EXPECT_FALSE(NSXMLTree::mayMoveTo(b.get(), a.get()));
+  EXPECT_FALSE(NSXMLTree::mayMoveTo(a.get(), a.get()));
+  EXPECT_FALSE(a->parent());
+}
+
 TEST(XMLTree, AddingANodeMovesItAndKeepsItsIdentity) {
   const auto parent = element("p");
   const auto child = element("c");
