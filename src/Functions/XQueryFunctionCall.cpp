@@ -71,6 +71,7 @@ void XQueryFunctionCall::bindInfoForProlog(XQueryProlog& prolog) {
     }
     if (!_function) _functionDecl = prolog.functionInfoForSignature({qName, argumentCount()});
   }
+  if (!_function) prolog.countAdopter();
   if (_args) _args->bindInfoForProlog(prolog);
 }
 

@@ -134,6 +134,11 @@ class XQueryProlog : public NSCounted {
   };
   LocalScope localScope() const { return {_nextLocalVariableID, _localVariableLog.size()}; }
   void restoreLocalScope(const LocalScope& scope);
+  // How many expressions have been bound that may give a node a parent: constructors that take in
+  // nodes, and calls of functions that may hold such constructors. The difference between two
+  // moments of the binding pass tells of what was bound in between.
+  size_t adopterCount() const { return _adopterCount; }
+  void countAdopter() { ++_adopterCount; }
   // Null when the name does not resolve.
   Ref<XQueryQName> variableQNameFromString(const Ref<NSString>& name) const;
   Ref<XQueryQName> functionQNameFromString(const Ref<NSString>& name) const;
@@ -209,6 +214,7 @@ class XQueryProlog : public NSCounted {
       _variables;
   std::unordered_map<XQueryFunctionSignature, Ref<XQueryFunctionDecl>, XQueryFunctionSignatureHash>
       _functions;
+  size_t _adopterCount = 0;
   int64_t _nextLocalVariableID = 1;
   std::unordered_map<Ref<XQueryQName>, int64_t, XQueryQNameHash, XQueryQNameEqual>
       _localVariableIDs;

@@ -72,6 +72,7 @@ size_t XQueryElementExpr::roomBytes() const {
 
 void XQueryElementExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
+  prolog.countAdopter();
   collectNamespaces(_attributes, _namespaces);
   collectNamespaces(_items, _namespaces);
   if (!_namespaces.empty()) prolog.pushInScopeNamespaces(_namespaces);

@@ -5,6 +5,7 @@
 #include "Expr/Constructors/XQueryContent.h"
 #include "Expr/Constructors/XQueryContentText.h"
 #include "Expr/XQueryLeaves.h"
+#include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "Types/XQueryStringFunctions.h"
@@ -92,6 +93,11 @@ Value XQueryProcessingInstructionExpr::evaluateWithContext(XQueryContext& contex
 
 Ref<XQueryDocumentExpr> XQueryDocumentExpr::documentWithExpr(Ref<XQueryExpr> expr) {
   return make<XQueryDocumentExpr>(std::move(expr));
+}
+
+void XQueryDocumentExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  prolog.countAdopter();
+  XQueryValueConstructor::bindInfoForProlog(prolog);
 }
 
 Value XQueryDocumentExpr::evaluateWithContext(XQueryContext& context) const {

@@ -70,6 +70,7 @@ class XQueryProcessingInstructionExpr : public XQueryExpr {
 class XQueryDocumentExpr : public XQueryValueConstructor {
  public:
   [[nodiscard]] static Ref<XQueryDocumentExpr> documentWithExpr(Ref<XQueryExpr> expr);
+  void bindInfoForProlog(XQueryProlog& prolog) override;
 
   Value evaluateWithContext(XQueryContext& context) const override;
 

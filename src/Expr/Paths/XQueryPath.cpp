@@ -18,6 +18,11 @@
 // node twice. The order differs (the two steps go parent by parent), so the child step takes the
 // descendant axis of the node only when no predicate can tell, both are repeatable with all steps
 // after them, and the path's results will be sorted.
+//
+// A walk sees the tree as it was when it began. A later step may put the very node that the walk
+// stands at into an element that it constructs, and a walk upwards would meet that element, the
+// one around it, and so on for ever. So a step before one that may give nodes a parent finds all
+// its nodes first and hands them on afterwards (findGatheringSteps).
 #include "Expr/Paths/XQueryPath.h"
 
 #include "Context/StackGuard.h"
@@ -27,6 +32,7 @@
 #include "Expr/XQueryReads.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Prolog/XQueryProlog.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 
@@ -84,11 +90,13 @@ void XQueryStep::setPredicates(std::vector<Ref<XQueryExpr>> predicates) {
 }
 
 void XQueryStep::bindInfoForProlog(XQueryProlog& prolog) {
+  const size_t adoptersBefore = prolog.adopterCount();
   if (_expr) _expr->bindInfoForProlog(prolog);
   for (const auto& predicate : _predicates) {
-    if (!predicate) return;
+    if (!predicate) break;
     predicate->bindInfoForProlog(prolog);
   }
+  _mayAdopt = prolog.adopterCount() != adoptersBefore;
 }
 
 bool XQueryStep::hasRepeatablePredicates(bool variablesMayChange) const {
@@ -248,7 +256,15 @@ void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& ru
     }
     return true;
   };
-  if (_trail != noTrail && !run.setsEveryFocus) {
+  if (_gathersFirst) {
+    std::vector<NSXMLNode*>& nodes = run.openNodeList();
+    XQueryWalkAxis(node, axis, [matches, &nodes](NSXMLNode* found) {
+      if (matches(found)) nodes.push_back(found);
+      return true;
+    });
+    for (NSXMLNode* found : nodes) next->processNode(found, run);
+    run.closeNodeList();
+  } else if (_trail != noTrail && !run.setsEveryFocus) {
     run.trail(_trail).walk(node, axis, handOn);
   } else {
     XQueryWalkAxis(node, axis, handOn);
@@ -385,6 +401,7 @@ void XQueryPathExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
   for (XQueryStep* step = _step.get(); step; step = step->next()) step->bindInfoForProlog(prolog);
   findShortcuts();
+  findGatheringSteps();
   _join = XQueryPathJoin::joinOf(_step.get());
 }
 
@@ -412,6 +429,16 @@ void XQueryPathExpr::findShortcuts() {
     const auto* previous = i == 0 ? nullptr : dyn_cast<XQueryAxisStep>(steps[i - 1]);
     const bool keepsTrail = !nodesMayGo && step->mayWalkTwice(previous);
     step->_trail = keepsTrail ? _trailCount++ : XQueryAxisStep::noTrail;
+  }
+}
+
+void XQueryPathExpr::findGatheringSteps() {
+  XQueryStep* last = nullptr;  // the last one that may give nodes a parent
+  for (XQueryStep* step = _step.get(); step; step = step->next()) {
+    if (step->_mayAdopt) last = step;
+  }
+  for (XQueryStep* step = _step.get(); last && step != last; step = step->next()) {
+    if (auto* axisStep = dyn_cast<XQueryAxisStep>(step)) axisStep->_gathersFirst = true;
   }
 }
 

@@ -95,6 +95,7 @@ class XQueryStep : public NSCounted {
   friend class XQueryPathExpr;
 
   std::vector<std::optional<uint64_t>> _literalPositions;  // one per predicate
+  bool _mayAdopt = false;  // its expressions may give a node a parent; set by binding
 };
 
 class XQueryAxisStep : public XQueryStep {
@@ -145,6 +146,7 @@ class XQueryAxisStep : public XQueryStep {
   int _axis;
   // Set by binding, see XQueryPath.cpp.
   bool _absorbsNext = false;
+  bool _gathersFirst = false;
   size_t _trail = noTrail;
 };
 
@@ -221,6 +223,7 @@ class XQueryPathExpr : public XQueryExpr {
   bool joinItems(Value& items, XQueryContext& context) const;
   bool joinNodes(const Value& start, const XQueryStep& firstStep, XQueryPathRun& run) const;
   void findShortcuts();
+  void findGatheringSteps();
 
   Ref<XQueryStep> _step;
   size_t _trailCount = 0;
