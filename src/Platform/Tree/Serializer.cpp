@@ -9,19 +9,27 @@
 //   - those that its name and the names of its attributes still lack. An attribute whose prefix
 //     means something else here gets a prefix that is free.
 //
+// A host may give names that no text can have. What is written is what a reader takes, and reads as
+// the same names as far as there are such: the reserved prefixes and namespaces are never declared;
+// a prefix that cannot have the namespace is replaced; a name without a namespace has no prefix; of
+// attributes that a reader would take for the same, the first is written; and an attribute that
+// spells a declaration is one.
+//
 // What XML cannot contain (control characters, lone surrogates) is written as U+FFFD, and comments
 // and processing instructions that would end early are written with a space in between, so that
 // the output is always well formed.
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/Names.h"
+#include "Platform/Tree/XMLOutput.h"
 #include "xquery/XMLNode.h"
 
-#include <array>
+#include <algorithm>
 #include <deque>
 #include <map>
 #include <set>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -30,150 +38,6 @@ namespace {
 
 NSStringView ascii(std::string_view text) {
   return NSStringView::ascii(text);
-}
-
-// --- output ----------------------------------------------------------------------------------
-
-// Collects UTF-8. With a sink, pieces of at most `pieceSize` bytes are handed to it.
-class Output {
- public:
-  using Sink = std::function<bool(std::string_view)>;
-  Output(std::string& buffer, const Sink* sink) : _buffer(buffer), _sink(sink) {}
-
-  bool isStopped() const { return _isStopped; }
-
-  void write(std::string_view bytes) {
-    if (!_sink) {
-      _buffer.append(bytes);
-      return;
-    }
-    while (!bytes.empty() && !_isStopped) {
-      const std::string_view part = bytes.substr(0, pieceSize - _buffer.size());
-      _buffer.append(part);
-      bytes.remove_prefix(part.size());
-      if (_buffer.size() == pieceSize) flush();
-    }
-  }
-  void write(char byte) { write(std::string_view(&byte, 1)); }
-  void write(NSStringView text) {
-    if (text.isWide()) {
-      write(std::string_view(text.utf8()));
-    } else {
-      write(std::string_view(text.asciiUnits(), text.length()));
-    }
-  }
-  void flush() {
-    if (!_sink || _buffer.empty()) return;
-    if (!_isStopped) _isStopped = !(*_sink)(_buffer);
-    _buffer.clear();
-  }
-
- private:
-  static constexpr size_t pieceSize = size_t{64} * 1024;
-  std::string& _buffer;
-  const Sink* _sink;
-  bool _isStopped = false;
-};
-
-// --- characters ------------------------------------------------------------------------------
-
-constexpr std::string_view replacement = "\xEF\xBF\xBD";
-
-// What is written in place of each of the first 128 characters; null for itself.
-using EscapeTable = std::array<const char*, 128>;
-
-constexpr EscapeTable illegalReplaced() {
-  EscapeTable table{};
-  for (size_t unit = 0; unit < ' '; ++unit) {
-    if (unit != '\t' && unit != '\n' && unit != '\r') table[unit] = replacement.data();
-  }
-  return table;
-}
-
-constexpr EscapeTable textEscapes() {
-  EscapeTable table = illegalReplaced();
-  table['&'] = "&amp;";
-  table['<'] = "&lt;";
-  table['>'] = "&gt;";
-  table['\r'] = "&#xD;";
-  return table;
-}
-
-constexpr EscapeTable attributeEscapes() {
-  EscapeTable table = illegalReplaced();
-  table['&'] = "&amp;";
-  table['<'] = "&lt;";
-  table['"'] = "&quot;";
-  table['\t'] = "&#x9;";
-  table['\n'] = "&#xA;";
-  table['\r'] = "&#xD;";
-  return table;
-}
-
-// A section cannot refer to characters: it is closed for a carriage return.
-constexpr EscapeTable CDATAEscapes() {
-  EscapeTable table = illegalReplaced();
-  table['\r'] = "]]>&#xD;<![CDATA[";
-  return table;
-}
-
-constexpr EscapeTable plainTable = illegalReplaced();
-constexpr EscapeTable textTable = textEscapes();
-constexpr EscapeTable attributeTable = attributeEscapes();
-constexpr EscapeTable CDATATable = CDATAEscapes();
-
-void writeNarrow(Output& out, std::string_view text, const EscapeTable& table) {
-  size_t start = 0;
-  for (size_t at = 0; at < text.size(); ++at) {
-    const char* escape = table[static_cast<unsigned char>(text[at])];
-    if (!escape) continue;
-    out.write(text.substr(start, at - start));
-    out.write(std::string_view(escape));
-    start = at + 1;
-  }
-  out.write(text.substr(start));
-}
-
-// Runs without anything to replace are converted as a whole; so are surrogate pairs within them.
-void writeWide(Output& out, NSStringView text, const EscapeTable& table) {
-  constexpr uint32_t runLength = 8192;
-  uint32_t start = 0;
-  const auto writeRun = [&](uint32_t end) { out.write(text.substring(start, end - start)); };
-  for (uint32_t at = 0; at < text.length(); ++at) {
-    const char16_t unit = text.wideUnits()[at];
-    const char* escape = unit < 0x80 ? table[unit] : unit >= 0xFFFE ? replacement.data() : nullptr;
-    if (escape) {
-      writeRun(at);
-      out.write(std::string_view(escape));
-      start = at + 1;
-    } else if (at - start >= runLength && (unit < 0xDC00 || unit >= 0xE000)) {
-      writeRun(at);  // not between the halves of a pair
-      start = at;
-    }
-  }
-  writeRun(text.length());
-}
-
-void writeEscaped(Output& out, NSStringView text, const EscapeTable& table) {
-  if (text.isWide()) {
-    writeWide(out, text, table);
-  } else {
-    writeNarrow(out, {text.asciiUnits(), text.length()}, table);
-  }
-}
-
-// Writes `between` in the middle of every occurrence of `separated`, after its first `keep` units.
-void writeSeparated(Output& out, NSStringView text, std::string_view separated, uint32_t keep,
-                    std::string_view between, const EscapeTable& table) {
-  uint32_t start = 0;
-  while (true) {
-    const uint32_t found = text.find(ascii(separated), start);
-    if (found == NSStringView::notFound) break;
-    writeEscaped(out, text.substring(start, found + keep - start), table);
-    out.write(between);
-    start = found + keep;
-  }
-  writeEscaped(out, text.substring(start), table);
 }
 
 // --- declarations in scope -------------------------------------------------------------------
@@ -196,9 +60,8 @@ class NamespaceScope {
     at(declaration.prefix).meanings.push_back({element, declaration.URI});
     _declarations.push_back({element, declaration.prefix});
   }
-  // A name in the start tag of the element has the prefix, whatever it means.
-  void use(const NSXMLNode* element, NSStringView prefix) { at(prefix).lastUser = element; }
-  // The same where the prefix has that meaning; otherwise nothing, and false.
+  // A name in the start tag of the element has the prefix, where it has that meaning; otherwise
+  // nothing, and false.
   bool useAs(const NSXMLNode* element, const Declaration& meaning) {
     Prefix& known = at(meaning.prefix);
     if (!known.URI().equals(meaning.URI)) return false;
@@ -248,15 +111,68 @@ class NamespaceScope {
   std::vector<Entry> _declarations;
 };
 
+// --- what names can be ---------------------------------------------------------------------------
+
+constexpr std::string_view namespaceOfXML = "http://www.w3.org/XML/1998/namespace";
+constexpr std::string_view namespaceOfDeclarations = "http://www.w3.org/2000/xmlns/";
+
 bool isReserved(NSStringView prefix) {
   return prefix == "xml" || prefix == "xmlns";
+}
+
+// Only the default namespace can be undeclared.
+bool mayBeDeclared(const Declaration& declaration) {
+  if (isReserved(declaration.prefix)) return false;
+  if (declaration.URI.isEmpty()) return declaration.prefix.isEmpty();
+  return declaration.URI != namespaceOfXML && declaration.URI != namespaceOfDeclarations;
+}
+
+// The prefix that a name is written with, and what it has to mean. A name with the prefix of XML's
+// own namespace is in it, should nobody have said so; nothing is in the namespace of declarations.
+Declaration neededFor(const NSXMLNode* named) {
+  const Declaration written{named->prefixView(), named->URIView()};
+  if (written.URI == namespaceOfXML || (written.URI.isEmpty() && written.prefix == "xml")) {
+    return {ascii("xml"), ascii(namespaceOfXML)};
+  }
+  if (written.URI.isEmpty() || written.URI == namespaceOfDeclarations) return {};
+  return written;
+}
+
+bool contradicts(const Declaration& declaration, const Declaration& needed) {
+  return declaration.prefix.equals(needed.prefix) && !declaration.URI.equals(needed.URI);
+}
+
+bool spellsDeclaration(const NSXMLNode* attribute) {
+  const NSStringView URI = attribute->URIView();
+  if (URI == namespaceOfDeclarations) return true;
+  return URI.isEmpty() && (attribute->nameView() == "xmlns" || attribute->prefixView() == "xmlns");
+}
+
+Declaration declarationSpeltBy(const NSXMLNode* attribute) {
+  const bool isDefault = attribute->nameView() == "xmlns";
+  return {isDefault ? NSStringView() : attribute->localNameView(), attribute->textView()};
+}
+
+// An attribute, the prefix that it is written with, and the namespace that this means.
+struct WrittenAttribute {
+  const NSXMLNode* node;
+  Declaration needed;
+};
+
+// Drops the attributes whose names a reader would take for that of an earlier one.
+void dropRepeated(std::vector<WrittenAttribute>& attributes) {
+  std::set<std::pair<std::string, std::string>> seen;
+  std::erase_if(attributes, [&](const WrittenAttribute& each) {
+    checkWork();
+    return !seen.emplace(each.needed.URI.utf8(), each.node->localNameView().utf8()).second;
+  });
 }
 
 // --- the walk --------------------------------------------------------------------------------
 
 class Serializer {
  public:
-  Serializer(const NSXMLNode* root, Output& out) : _root(root), _out(out) {}
+  Serializer(const NSXMLNode* root, XMLOutput& out) : _root(root), _out(out) {}
   void run();
 
  private:
@@ -264,27 +180,34 @@ class Serializer {
   void close(const NSXMLNode* node);
   void writeLeaf(const NSXMLNode* node);
   void writeStartTag(const NSXMLElement* element);
+  void writeName(const NSXMLNode* element, NSStringView prefix);
   void writeAttribute(NSStringView prefix, NSStringView localName, NSStringView value);
   void writeDeclaration(const Declaration& declaration);
 
-  // Fill `_declared`, what the start tag of the element declares.
-  void declareFor(const NSXMLElement* element);
-  void declareOwn(const NSXMLElement* element);
-  void declareInherited(const NSXMLElement* element);
-  void declareForName(const NSXMLElement* element);
+  // Fill `_declared`, what the start tag of the element declares, and `_attributes`. Answer: the
+  // prefix that the element is written with. Declarations that contradict what the name needs are
+  // left out.
+  NSStringView declareFor(const NSXMLElement* element);
+  void declareOwn(const NSXMLElement* element, const Declaration& needed);
+  void declareInherited(const NSXMLElement* element, const Declaration& needed);
+  NSStringView prefixForName(const NSXMLElement* element, const Declaration& needed);
+  void chooseAttributes(const NSXMLElement* element);
+  bool mayRepeatNames();
   void declare(const NSXMLElement* element, const Declaration& declaration) {
     _declared.push_back(declaration);
     _scope.declare(element, declaration);
   }
-  // The prefix to write the name of an attribute in a namespace with.
-  NSStringView prefixForAttribute(const NSXMLElement* element, const NSXMLNode* attribute);
+  NSStringView prefixForAttribute(const NSXMLElement* element, const Declaration& needed);
   NSStringView madePrefix(const NSXMLElement* element, NSStringView URI);
 
   const NSXMLNode* _root;
-  Output& _out;
+  XMLOutput& _out;
   NamespaceScope _scope;
-  std::vector<Declaration> _declared;                 // in the start tag at hand
-  std::vector<NSStringView> _attributePrefixes;       // of its attributes in turn
+  std::vector<Declaration> _declared;         // in the start tag at hand
+  std::vector<WrittenAttribute> _attributes;  // in the same
+  std::vector<const NSXMLExpandedName*> _attributeNames;
+  // Open elements with another prefix than their own.
+  std::vector<std::pair<const NSXMLNode*, NSStringView>> _renamed;
   std::map<std::string, NSStringView> _madePrefixes;  // by URI
   std::deque<std::string> _madeTexts;
 };
@@ -321,9 +244,22 @@ void Serializer::open(const NSXMLNode* node) {
 void Serializer::close(const NSXMLNode* node) {
   if (node->kind() != Kind::Element) return;
   _out.write("</");
-  _out.write(node->nameView());
+  if (!_renamed.empty() && _renamed.back().first == node) {
+    writeName(node, _renamed.back().second);
+    _renamed.pop_back();
+  } else {
+    _out.write(node->nameView());
+  }
   _out.write('>');
   _scope.leave(node);
+}
+
+void Serializer::writeName(const NSXMLNode* element, NSStringView prefix) {
+  if (!prefix.isEmpty()) {
+    _out.write(prefix);
+    _out.write(':');
+  }
+  _out.write(element->localNameView());
 }
 
 void Serializer::writeLeaf(const NSXMLNode* node) {
@@ -331,7 +267,7 @@ void Serializer::writeLeaf(const NSXMLNode* node) {
   switch (node->kind()) {
     case Kind::Comment:
       _out.write("<!--");
-      writeSeparated(_out, text, "--", 1, " ", plainTable);
+      XMLWriteSeparated(_out, text, "--", 1, " ", XMLPlainEscapes);
       if (text.endsWith(ascii("-"))) _out.write(' ');
       _out.write("-->");
       break;
@@ -339,7 +275,7 @@ void Serializer::writeLeaf(const NSXMLNode* node) {
       _out.write("<?");
       _out.write(node->nameView());
       if (!text.isEmpty()) _out.write(' ');
-      writeSeparated(_out, text, "?>", 1, " ", plainTable);
+      XMLWriteSeparated(_out, text, "?>", 1, " ", XMLPlainEscapes);
       _out.write("?>");
       break;
     case Kind::Attribute:
@@ -351,10 +287,10 @@ void Serializer::writeLeaf(const NSXMLNode* node) {
     default:
       if (NSXMLTree::isCDATA(node)) {
         _out.write("<![CDATA[");
-        writeSeparated(_out, text, "]]>", 2, "]]><![CDATA[", CDATATable);
+        XMLWriteSeparated(_out, text, "]]>", 2, "]]><![CDATA[", XMLCDATAEscapes);
         _out.write("]]>");
       } else {
-        writeEscaped(_out, text, textTable);
+        XMLWriteEscaped(_out, text, XMLTextEscapes);
       }
   }
 }
@@ -366,7 +302,7 @@ void Serializer::writeAttribute(NSStringView prefix, NSStringView localName, NSS
   }
   _out.write(localName);
   _out.write("=\"");
-  writeEscaped(_out, value, attributeTable);
+  XMLWriteEscaped(_out, value, XMLAttributeEscapes);
   _out.write('"');
 }
 
@@ -379,26 +315,28 @@ void Serializer::writeDeclaration(const Declaration& declaration) {
 }
 
 void Serializer::writeStartTag(const NSXMLElement* element) {
-  declareFor(element);
+  const NSStringView prefix = declareFor(element);
+  const bool isRenamed = !prefix.equals(element->prefixView());
   _out.write('<');
-  _out.write(element->nameView());
+  if (isRenamed) {
+    writeName(element, prefix);
+  } else {
+    _out.write(element->nameView());
+  }
   for (const Declaration& declaration : _declared) {
     _out.write(' ');
     writeDeclaration(declaration);
   }
-  size_t index = 0;
   WorkPacer pacer;
-  for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
-       attribute = NSXMLElement::nextAttribute(attribute)) {
+  for (const WrittenAttribute& attribute : _attributes) {
     pacer.turn();
     _out.write(' ');
-    const NSStringView prefix = _attributePrefixes[index++];
-    const bool isPlain = attribute->URIView().isEmpty();
-    writeAttribute(prefix, isPlain ? attribute->nameView() : attribute->localNameView(),
-                   attribute->textView());
+    writeAttribute(attribute.needed.prefix, attribute.node->localNameView(),
+                   attribute.node->textView());
   }
   if (element->firstChild()) {
     _out.write('>');
+    if (isRenamed) _renamed.emplace_back(element, prefix);
   } else {
     _out.write("/>");
     _scope.leave(element);
@@ -407,15 +345,11 @@ void Serializer::writeStartTag(const NSXMLElement* element) {
 
 // --- which declarations ----------------------------------------------------------------------
 
-void Serializer::declareOwn(const NSXMLElement* element) {
+void Serializer::declareOwn(const NSXMLElement* element, const Declaration& needed) {
   for (const NSXMLNode* node = element->firstNamespace(); node;
        node = NSXMLElement::nextNamespace(node)) {
     const Declaration own{node->nameView(), node->textView()};
-    if (isReserved(own.prefix)) continue;
-    // Only the default namespace can be undeclared.
-    if (own.URI.isEmpty() && !own.prefix.isEmpty()) continue;
-    if (own.prefix.equals(element->prefixView()) && !own.URI.equals(element->URIView())) continue;
-    declare(element, own);
+    if (mayBeDeclared(own) && !contradicts(own, needed)) declare(element, own);
   }
 }
 
@@ -434,8 +368,7 @@ std::vector<Declaration> declarationsAbove(const NSXMLElement* element) {
       checkWork();
       const Declaration declaration{own->nameView(), own->textView()};
       if (!seen.insert(declaration.prefix.utf8()).second || place == element) continue;
-      if (declaration.prefix.isEmpty() || declaration.URI.isEmpty()) continue;
-      if (!isReserved(declaration.prefix)) found.push_back(declaration);
+      if (!declaration.prefix.isEmpty() && mayBeDeclared(declaration)) found.push_back(declaration);
     }
   }
   return found;
@@ -476,31 +409,27 @@ class UsedPrefixes {
 
 }  // namespace
 
-void Serializer::declareInherited(const NSXMLElement* element) {
+void Serializer::declareInherited(const NSXMLElement* element, const Declaration& needed) {
   const std::vector<Declaration> above = declarationsAbove(element);
   if (above.empty()) return;
   const UsedPrefixes used(element);
   for (const Declaration& declaration : above) {
-    if (used.contains(declaration)) declare(element, declaration);
+    if (!contradicts(declaration, needed) && used.contains(declaration)) {
+      declare(element, declaration);
+    }
   }
 }
 
-void Serializer::declareForName(const NSXMLElement* element) {
-  const Declaration needed{element->prefixView(), element->URIView()};
-  // A prefix without a URI is written as it is: there is nothing to declare it as.
-  if (isReserved(needed.prefix) || (!needed.prefix.isEmpty() && needed.URI.isEmpty())) {
-    _scope.use(element, needed.prefix);
-  } else if (!_scope.useAs(element, needed)) {
-    declare(element, needed);
-  }
+NSStringView Serializer::prefixForName(const NSXMLElement* element, const Declaration& needed) {
+  if (needed.URI == namespaceOfXML) return needed.prefix;
+  if (isReserved(needed.prefix)) return madePrefix(element, needed.URI);
+  if (!_scope.useAs(element, needed)) declare(element, needed);
+  return needed.prefix;
 }
 
 NSStringView Serializer::prefixForAttribute(const NSXMLElement* element,
-                                            const NSXMLNode* attribute) {
-  const Declaration needed{attribute->prefixView(), attribute->URIView()};
-  // This namespace has one prefix, which is never declared, and the reserved ones stand for no
-  // other.
-  if (needed.URI == "http://www.w3.org/XML/1998/namespace") return ascii("xml");
+                                            const Declaration& needed) {
+  if (needed.URI.isEmpty() || needed.URI == namespaceOfXML) return needed.prefix;
   if (!needed.prefix.isEmpty() && !isReserved(needed.prefix)) {
     if (_scope.useAs(element, needed)) return needed.prefix;
     if (!_scope.isTaken(element, needed.prefix)) {
@@ -523,20 +452,49 @@ NSStringView Serializer::madePrefix(const NSXMLElement* element, NSStringView UR
   return prefix;
 }
 
-void Serializer::declareFor(const NSXMLElement* element) {
+NSStringView Serializer::declareFor(const NSXMLElement* element) {
   _declared.clear();
-  _attributePrefixes.clear();
-  declareOwn(element);
-  if (element == _root) declareInherited(element);
-  declareForName(element);
+  const Declaration needed = neededFor(element);
+  declareOwn(element, needed);
+  if (element == _root) declareInherited(element, needed);
+  const NSStringView prefix = prefixForName(element, needed);
+  chooseAttributes(element);
+  WorkPacer pacer;
+  for (WrittenAttribute& attribute : _attributes) {
+    pacer.turn();
+    attribute.needed.prefix = prefixForAttribute(element, attribute.needed);
+  }
+  return prefix;
+}
+
+void Serializer::chooseAttributes(const NSXMLElement* element) {
+  _attributes.clear();
   WorkPacer pacer;
   for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
        attribute = NSXMLElement::nextAttribute(attribute)) {
     pacer.turn();
-    // A name without a URI is written as it is.
-    const bool isPlain = attribute->URIView().isEmpty();
-    _attributePrefixes.push_back(isPlain ? NSStringView() : prefixForAttribute(element, attribute));
+    if (!spellsDeclaration(attribute)) {
+      _attributes.push_back({attribute, neededFor(attribute)});
+      continue;
+    }
+    const Declaration spelt = declarationSpeltBy(attribute);
+    if (mayBeDeclared(spelt) && !_scope.isTaken(element, spelt.prefix)) declare(element, spelt);
   }
+  if (mayRepeatNames()) dropRepeated(_attributes);
+}
+
+// Names that differ are written as different ones, but for those in XML's own namespace that do not
+// say so.
+bool Serializer::mayRepeatNames() {
+  if (_attributes.size() < 2) return false;
+  _attributeNames.clear();
+  for (const WrittenAttribute& attribute : _attributes) {
+    if (attribute.needed.URI.length() != attribute.node->URIView().length()) return true;
+    _attributeNames.push_back(attribute.node->expandedName());
+  }
+  std::sort(_attributeNames.begin(), _attributeNames.end());
+  return std::adjacent_find(_attributeNames.begin(), _attributeNames.end()) !=
+         _attributeNames.end();
 }
 
 }  // namespace
@@ -544,13 +502,13 @@ void Serializer::declareFor(const NSXMLElement* element) {
 // --- the node's own functions ----------------------------------------------------------------
 
 void NSXMLNode::appendXMLTo(std::string& utf8) const {
-  Output out(utf8, nullptr);
+  XMLOutput out(utf8, nullptr);
   Serializer(this, out).run();
 }
 
 void NSXMLNode::writeXML(const std::function<bool(std::string_view)>& write) const {
   std::string buffer;
-  Output out(buffer, &write);
+  XMLOutput out(buffer, &write);
   Serializer(this, out).run();
 }
 
