@@ -76,21 +76,17 @@ bool XQueryContextInternal::xmlSpacePreserve() const {
 }
 
 void XQueryContextInternal::pushInScopeNamespaces(std::vector<Ref<NSXMLNode>> namespaces) {
-  _inScopeNamespaces.push_back(std::move(namespaces));
+  _inScopeNamespaces.push(std::move(namespaces));
 }
 
 void XQueryContextInternal::popInScopeNamespaces() {
-  if (!_inScopeNamespaces.empty()) _inScopeNamespaces.pop_back();
+  _inScopeNamespaces.pop();
 }
 
 Ref<NSString> XQueryContextInternal::firstPrefixForNamespace(const Ref<NSString>& URI) const {
   if (!URI) return {};
-  WorkPacer pacer;
-  for (auto entry = _inScopeNamespaces.rbegin(); entry != _inScopeNamespaces.rend(); ++entry) {
-    pacer.turn();
-    for (const auto& node : *entry) {
-      if (node->textView() == URI->view()) return node->name();
-    }
+  if (const NSXMLNode* declaration = _inScopeNamespaces.forURI(URI->view())) {
+    return declaration->name();
   }
   if (!_prolog) return {};
   const Value prefixes = _prolog->prefixesForID(_prolog->namespaceID(URI));
@@ -101,14 +97,7 @@ Ref<NSString> XQueryContextInternal::firstPrefixForNamespace(const Ref<NSString>
 }
 
 const NSXMLNode* XQueryContextInternal::inScopeNamespaceForPrefix(NSStringView prefix) const {
-  WorkPacer pacer;
-  for (auto entry = _inScopeNamespaces.rbegin(); entry != _inScopeNamespaces.rend(); ++entry) {
-    pacer.turn();
-    for (const auto& node : *entry) {
-      if (node->nameView() == prefix) return node.get();
-    }
-  }
-  return nullptr;
+  return _inScopeNamespaces.forPrefix(prefix);
 }
 
 Ref<NSString> XQueryContextInternal::contextNamespaceForPrefix(NSStringView prefix) const {

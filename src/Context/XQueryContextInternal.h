@@ -4,6 +4,7 @@
 
 #include "Context/KeptValues.h"
 #include "Context/XQueryFrame.h"
+#include "Context/XQueryNamespaceStack.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Error.h"
@@ -131,7 +132,7 @@ class XQueryContextInternal {
 
  private:
   XQueryFrameRef _variables;
-  std::vector<std::vector<Ref<NSXMLNode>>> _inScopeNamespaces;
+  XQueryNamespaceStack _inScopeNamespaces;
   const uint64_t _baseURIOwner;  // this context's number among those that record base URIs
   size_t _baseURINodeCount = 0;
   // The URI given last, and a copy of it that refers to no tree.

@@ -93,7 +93,9 @@ Value XQueryElementExpr::evaluateWithContext(XQueryContext& context) const {
       NSXMLTree::makeLoneElement(_name.evaluate(context, exprLine()).detach(), _roomBytes, room);
   XQueryElementContent content(*element, room, namespaces, context, exprLine());
   dynamic.setBaseURI(dynamic.baseURI(), element.get());
-  for (const auto& declaration : _namespaces) element->addNamespace(declaration->copy());
+  for (const auto& declaration : _namespaces) {
+    namespaces.declare(*element, *declaration->copy());
+  }
   namespaces.updateNamespacesForElement(*element, *element->nodeName());
 
   for (const auto& expr : _attributes) {

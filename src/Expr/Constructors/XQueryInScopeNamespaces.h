@@ -6,6 +6,9 @@
 #include "xquery/XMLNode.h"
 
 #include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <unordered_set>
 #include <vector>
 
 namespace xquery {
@@ -23,6 +26,10 @@ class XQueryInScopeNamespaces {
 
   void push(std::vector<Ref<NSXMLNode>> namespaces);
 
+  // Adds a parentless declaration to the element, unless that declares the prefix already. An
+  // element gets all its declarations here while it is constructed.
+  void declare(NSXMLElement& element, NSXMLNode& declaration);
+
   // Declares the prefix of a name, the element's own or that of an attribute it gets, on the
   // element, unless an element under construction has declared it with the same URI already.
   // Predefined prefixes need no declaration. Answer: whether it declared it.
@@ -33,8 +40,13 @@ class XQueryInScopeNamespaces {
   void keepNamespaces(NSXMLElement& copy, const NSXMLElement& formerParent);
 
  private:
+  bool isNewPrefix(const NSXMLElement& element, const NSXMLName* prefix);
+
   XQueryContextInternal& _context;
   size_t _count = 0;
+  NSXMLNode* _lastDeclared = nullptr;
+  uint32_t _declaredCount = 0;
+  std::unique_ptr<std::unordered_set<const NSXMLName*>> _declared;  // when there are many
 };
 
 }  // namespace xquery
