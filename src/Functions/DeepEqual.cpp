@@ -1,6 +1,7 @@
 // Two sequences are deep-equal when they have as many items, not none, and their items are so pair
 // by pair; two empty ones are so too. Nodes are compared by the trees below them, atomic values as
-// "eq" compares them, and a node equals no atomic value. What cannot be compared differs.
+// "eq" compares them, and a node equals no atomic value. What cannot be compared differs. A host
+// may leave places of an array empty: they are like the empty sequence there.
 #include "Functions/DeepEqual.h"
 
 #include "Context/XQueryContextInternal.h"
@@ -28,6 +29,10 @@ bool sameItems(NSObject* a, NSObject* b, XQueryContext& context) {
       XQueryOperatorExpr::evaluateOperator(XQueryOperatorEq, Value(a), Value(b), context));
 }
 
+bool isEmpty(const NSObject* item) {
+  return !item || item->kind() == Kind::Null;
+}
+
 // Two arrays and the next pair of elements to compare.
 struct Pair {
   const NSArray* a;
@@ -46,7 +51,7 @@ bool same(NSObject* a, NSObject* b, XQueryContext& context) {
       return first->count() == second->count() && first->count() > 0;
     }
     if (first || second) return false;
-    if (isa<NSNull>(x) || isa<NSNull>(y)) return isa<NSNull>(x) && isa<NSNull>(y);
+    if (isEmpty(x) || isEmpty(y)) return isEmpty(x) && isEmpty(y);
     return sameItems(x, y, context);
   };
   if (!compare(a, b)) return false;

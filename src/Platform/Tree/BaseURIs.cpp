@@ -3,6 +3,7 @@
 //
 // Reading does not change the ring, only the place where the next search starts, so that several
 // threads may ask.
+#include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 
 #include <new>
@@ -15,7 +16,9 @@ namespace {
 NSXMLBaseURI* findEntry(NSXMLBaseURI* start, const NSXMLNode* node, uint64_t owner) {
   if (!start) return nullptr;
   NSXMLBaseURI* entry = start;
+  WorkPacer pacer;
   do {
+    pacer.turn();
     entry = entry->next;
     if (entry->node == node && entry->owner == owner) return entry;
   } while (entry != start);
