@@ -153,6 +153,10 @@ const std::vector<Work>& longWork() {
       {"AtomizingEach", "for $k in 1 to 1000000 return count(data(//e))", Input::Wide},
       {"ComparingNodes", "for $k in 1 to 1000000 where //e = 'missing' return $k", Input::Wide},
       {"Names", "for $k in 1 to 1000000 for $e in //e return in-scope-prefixes($e)", Input::Deep},
+      {"BaseURIs", "for $k in 1 to 1000000 for $e in //e return base-uri($e)", Input::Deep},
+      {"RecordedBaseURIs",
+       "declare base-uri 'http://b/'; let $t := <t>{for $i in 1 to 100000 return <e/>}</t> "
+       "for $k in 1 to 1000000 for $e in reverse($t/e) return base-uri($e)"},
   };
   return rows;
 }

@@ -32,6 +32,16 @@ TEST(DeepEqual, TwoArraysOfNothingAreNotEqual) {
   EXPECT_EQ(equal(sequence({}), sequence({})), "false");
 }
 
+// As a host may hand them in.
+TEST(DeepEqual, EmptyPlacesOfArraysAreLikeEmptySequences) {
+  const auto list = [](Value last) { return sequence({integer(1), std::move(last)}); };
+  EXPECT_EQ(equal(list(Value()), list(Value())), "true");
+  EXPECT_EQ(equal(list(Value()), list(empty())), "true");
+  EXPECT_EQ(equal(list(Value()), list(integer(2))), "false");
+  EXPECT_EQ(equal(list(Value()), list(elementFrom("<a/>"))), "false");
+  EXPECT_EQ(equal(list(Value()), list(sequence({Value(), Value()}))), "false");
+}
+
 TEST(DeepEqual, NestedArraysAreComparedMemberByMember) {
   const auto nested = [](int64_t last) {
     return sequence({integer(1), sequence({integer(2), integer(last)})});

@@ -1,6 +1,6 @@
 // The arena of a tree.
 //
-//   NSXMLTree (40 bytes)        block of one node           bulk node block       text block
+//   NSXMLTree (48 bytes)        block of one node           bulk node block       text block
 //     count, order, blocks        head: tree, next            head, end             head
 //     last block ---------------> node                        node node node ...    text text ...
 //     names, cursors              [its text]
@@ -72,8 +72,7 @@ class NSXMLRoom {
 };
 
 // A base URI on record for a node. The entries of a tree are a ring: the tree knows the one found
-// or added last, and two rings are joined in constant time. Nodes are recorded in about the order
-// in which they are asked for, so the search that goes on from there is short.
+// or added last, and two rings are joined in constant time.
 struct NSXMLBaseURI {
   NSXMLBaseURI* next;
   const NSXMLNode* node;
@@ -271,10 +270,11 @@ class NSXMLTree : public NSXMLTreeHead {
   static constexpr uintptr_t tagBits = 3;
   uintptr_t _extra = 0;
   NSXMLBaseURI* _baseURIs = nullptr;
+  bool _baseURIsAreAlike = true;  // of one owner, with one URI
   uint64_t _era = NSXMLEra::current();  // in which it was made; of merged trees the older one's
 };
 
-static_assert(sizeof(NSXMLTree) == 40 && sizeof(NSXMLBaseURI) == 32);
+static_assert(sizeof(NSXMLTree) == 48 && sizeof(NSXMLBaseURI) == 32);
 
 // The time in which a constructor fills a new node, the root of its tree.
 class NSXMLUnfinished {

@@ -408,6 +408,22 @@ TEST_F(ElementExpr, NestingIsBoundedByTheStackWhileEvaluating) {
   EXPECT_EQ(context->_internal().error()->msg()->utf8(), "limit: expression nested too deeply");
 }
 
+// Each attribute declares a prefix of its own.
+TEST_F(ElementExpr, ManyDeclarationsTakeLinearTime) {
+  const auto secondsFor = [&](size_t count) {
+    const std::string query = "count(in-scope-prefixes(<e>{for $i in 1 to " +
+                              std::to_string(count) +
+                              " return attribute {QName(concat('urn:', $i), "
+                              "concat('p', $i, ':a'))} {1}}</e>))";
+    return processorSecondsOf([&] {
+      const auto counted = items(query);
+      ASSERT_EQ(counted.size(), 1u);
+      EXPECT_EQ(XQueryItemStringValue(*counted[0]), std::to_string(count + 1));
+    });
+  };
+  EXPECT_TRUE(growsInProportion(secondsFor, 8000));
+}
+
 TEST_F(ElementExpr, SomeThousandLevelsAreFine) {
   std::string query;
   for (int depth = 0; depth < 2000; ++depth) query += "<a>";
