@@ -4,8 +4,8 @@
 
 #include "Context/KeptValues.h"
 #include "Context/XQueryFrame.h"
-#include "Context/XQueryNamespaceStack.h"
 #include "Platform/Loading/NSURLLoader.h"
+#include "Prolog/XQueryNamespaceStack.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"

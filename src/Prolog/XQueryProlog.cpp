@@ -178,17 +178,9 @@ void XQueryProlog::setDefaultFunctionNamespace(Ref<NSString> URI) {
 
 Ref<NSString> XQueryProlog::namespaceForPrefix(NSStringView prefix, bool& fromProlog) const {
   checkWork();
-  WorkPacer pacer;
-  for (auto entry = _inScopeNamespaces.rbegin(); entry != _inScopeNamespaces.rend(); ++entry) {
-    pacer.turn();
-    for (const auto& node : *entry) {
-      pacer.turn();
-      if (!node->nameView().equals(prefix)) continue;
-      fromProlog = false;
-      return node->stringValue();
-    }
-  }
-  fromProlog = true;
+  const NSXMLNode* declaration = _inScopeNamespaces.forPrefix(prefix);
+  fromProlog = !declaration;
+  if (declaration) return declaration->stringValue();
   return namespaceForID(namespaceIDForPrefix(prefix));
 }
 
@@ -255,11 +247,11 @@ void XQueryProlog::addPrefix(const Ref<NSString>& prefix, const Ref<NSString>& f
 }
 
 void XQueryProlog::pushInScopeNamespaces(std::vector<Ref<NSXMLNode>> namespaces) {
-  _inScopeNamespaces.push_back(std::move(namespaces));
+  _inScopeNamespaces.push(std::move(namespaces));
 }
 
 void XQueryProlog::popInScopeNamespaces() {
-  if (!_inScopeNamespaces.empty()) _inScopeNamespaces.pop_back();
+  _inScopeNamespaces.pop();
 }
 
 // --- names ---------------------------------------------------------------------------------------

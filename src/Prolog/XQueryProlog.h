@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Prolog/StringTable.h"
+#include "Prolog/XQueryNamespaceStack.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
@@ -219,7 +220,7 @@ class XQueryProlog : public NSCounted {
   std::unordered_map<Ref<XQueryQName>, int64_t, XQueryQNameHash, XQueryQNameEqual>
       _localVariableIDs;
   std::vector<NamedLocal> _localVariableLog;  // in the order the IDs were handed out
-  std::vector<std::vector<Ref<NSXMLNode>>> _inScopeNamespaces;
+  XQueryNamespaceStack _inScopeNamespaces;
   bool _xmlSpacePreserve = false;
   bool _constructionPreserve = true;
   bool _ordered = true;

@@ -1,4 +1,4 @@
-#include "Context/XQueryNamespaceStack.h"
+#include "Prolog/XQueryNamespaceStack.h"
 
 #include "Platform/Base/WorkMeter.h"
 
@@ -24,6 +24,8 @@ void XQueryNamespaceStack::pop() {
       if (found->second.empty()) _table.erase(found);
     }
     --_tabulated;
+  } else {
+    _untabulated -= _entries.back().size();
   }
   _entries.pop_back();
 }
@@ -31,17 +33,18 @@ void XQueryNamespaceStack::pop() {
 void XQueryNamespaceStack::tabulate() const {
   WorkPacer pacer;
   for (; _tabulated < _entries.size(); ++_tabulated) {
-    pacer.turn();
     const Entry& entry = _entries[_tabulated];
     for (auto node = entry.rbegin(); node != entry.rend(); ++node) {
+      pacer.turn();
       _table[(*node)->nameView()].push_back(node->get());
     }
   }
+  _untabulated = 0;
 }
 
 const NSXMLNode* XQueryNamespaceStack::forPrefix(NSStringView prefix) const {
   constexpr size_t few = 16;
-  if (_entries.size() - _tabulated > few) tabulate();
+  if (_untabulated > few) tabulate();
   for (size_t at = _entries.size(); at > _tabulated; --at) {
     const NSXMLNode* found = firstOf(
         _entries[at - 1], [prefix](const NSXMLNode& node) { return node.nameView() == prefix; });
