@@ -84,18 +84,27 @@ Ref<NSTimeZone> steadyZone(const XQueryDate& date) {
   return NSTimeZone::timeZoneForSecondsFromGMT(offset);
 }
 
-// The sum keeps only the fields of the type. Without a zone a time is read in GMT, though it is
-// built in the local zone: where that is another, the sum is off by the local offset, which callers
-// of the engine rely on.
-Value fieldsPlusSeconds(const XQueryDate& date, double seconds, XQueryTypeID type) {
+// The sum keeps only the fields of a date.
+Value datePlusSeconds(const XQueryDate& date, double seconds) {
   const std::optional<NSInstant> sum = date.instant().adding(seconds);
   if (!sum) return nullptr;
-  const bool isTime = type == XQueryTypeTime;
+  const NSGregorianDate fields = NSGregorianDateForInstant(*sum, *steadyZone(date));
+  return XQueryDate::xqueryDateWithGregorianDate(xqueryFieldsForType(fields, XQueryTypeDate),
+                                                 date.timeZone(), XQueryTypeDate);
+}
+
+// Goes round the clock. Without a zone the fields are counted as if they were in GMT, so that the
+// zone of the process, in which such a value has its instant, does not show.
+Value timePlusSeconds(const XQueryDate& time, double seconds) {
   const Ref<NSTimeZone> zone =
-      isTime && !date.timeZone() ? Ref<NSTimeZone>(NSTimeZone::GMT()) : steadyZone(date);
-  const NSGregorianDate fields = xqueryFieldsForType(NSGregorianDateForInstant(*sum, *zone), type);
-  return XQueryDate::xqueryDateWithGregorianDate(
-      fields, isTime ? date.timeZoneForFields(fields) : date.timeZone(), type);
+      time.timeZone() ? steadyZone(time) : Ref<NSTimeZone>(NSTimeZone::GMT());
+  const NSInstant start = NSInstantForGregorianDate(time.gregorianDate(), *zone);
+  const std::optional<NSInstant> sum = start.adding(seconds);
+  if (!sum) return nullptr;
+  const NSGregorianDate fields =
+      xqueryFieldsForType(NSGregorianDateForInstant(*sum, *zone), XQueryTypeTime);
+  return XQueryDate::xqueryDateWithGregorianDate(fields, time.timeZoneForFields(fields),
+                                                 XQueryTypeTime);
 }
 
 double secondsIn(const Value& duration) {
@@ -144,11 +153,11 @@ Value op_add_dayTimeDuration_to_dateTime(const Value& dateTime, const Value& dur
 }
 
 Value op_add_dayTimeDuration_to_date(const Value& date, const Value& duration, XQueryContext&) {
-  return fieldsPlusSeconds(dateIn(date), secondsIn(duration), XQueryTypeDate);
+  return datePlusSeconds(dateIn(date), secondsIn(duration));
 }
 
 Value op_add_dayTimeDuration_to_time(const Value& time, const Value& duration, XQueryContext&) {
-  return fieldsPlusSeconds(dateIn(time), secondsIn(duration), XQueryTypeTime);
+  return timePlusSeconds(dateIn(time), secondsIn(duration));
 }
 
 Value op_subtract_yearMonthDuration_from_dateTime(const Value& dateTime, const Value& duration,
@@ -168,12 +177,12 @@ Value op_subtract_dayTimeDuration_from_dateTime(const Value& dateTime, const Val
 
 Value op_subtract_dayTimeDuration_from_date(const Value& date, const Value& duration,
                                             XQueryContext&) {
-  return fieldsPlusSeconds(dateIn(date), -secondsIn(duration), XQueryTypeDate);
+  return datePlusSeconds(dateIn(date), -secondsIn(duration));
 }
 
 Value op_subtract_dayTimeDuration_from_time(const Value& time, const Value& duration,
                                             XQueryContext&) {
-  return fieldsPlusSeconds(dateIn(time), -secondsIn(duration), XQueryTypeTime);
+  return timePlusSeconds(dateIn(time), -secondsIn(duration));
 }
 
 Value op_subtract_dates(const Value& a, const Value& b, XQueryContext&) {

@@ -9,8 +9,11 @@ namespace xquery {
 
 namespace {
 
-// Below this every double holds its whole part, and so does a machine integer.
-constexpr double wholeBound = 9223372036854775808.0;
+// The greatest number that is read is the greatest machine integer, whose double is one more.
+std::string wholeText(double seconds) {
+  constexpr double twoTo63 = 9223372036854775808.0;
+  return std::to_string(seconds < twoTo63 ? static_cast<int64_t>(seconds) : INT64_MAX);
+}
 
 // A number that was read and waits for its designator. Each field may be left out, but a number
 // must have one.
@@ -84,8 +87,8 @@ std::string XQueryDuration::timeText() const {
   appendField(text, _hour, 'H');
   appendField(text, _minute, 'M');
   if (_second != 0) {
-    const bool whole = _second == std::trunc(_second) && _second < wholeBound;
-    text += (whole ? std::to_string(static_cast<int64_t>(_second)) : formatDouble(_second)) + "S";
+    const bool whole = _second == std::trunc(_second);
+    text += (whole ? wholeText(_second) : formatDouble(_second)) + "S";
   }
   return text;
 }

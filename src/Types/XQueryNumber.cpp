@@ -66,12 +66,6 @@ XQueryNumber* specialFor(double value) {
   return std::isinf(value) ? sharedInfinity(std::signbit(value)) : nullptr;
 }
 
-// The whole part as an integer; what no integer holds becomes the greatest.
-int64_t wholePart(double value) {
-  if (std::isnan(value)) return 0;
-  return value >= twoTo63 ? INT64_MAX : static_cast<int64_t>(value);
-}
-
 std::string yearMonthText(int64_t value) {
   const bool negative = value < 0;
   const uint64_t total =
@@ -84,26 +78,35 @@ std::string yearMonthText(int64_t value) {
   return text;
 }
 
+// Below this a double has units and their fractions; from here on it is counted in decimal, from
+// the digits that it prints, as the functions that answer the parts of a duration do.
+constexpr double exactIntegers = 9007199254740992.0;  // 2 to the 53rd
+
 std::string dayTimeText(double value) {
-  double rest = std::fabs(value);
-  const auto take = [&rest](double unit) {
-    const int64_t count = wholePart(rest / unit);
-    rest -= static_cast<double>(count) * unit;
-    return count;
-  };
-  const int64_t days = take(86400);
-  const int64_t hours = take(3600);
-  const int64_t minutes = take(60);
+  const double magnitude = std::fabs(value);
+  std::string days;
+  double rest = 0;  // seconds of the day
+  if (magnitude < exactIntegers) {
+    rest = std::fmod(magnitude, 86400);
+    days = std::to_string(static_cast<int64_t>(magnitude / 86400));
+  } else {
+    const NSDecimal seconds = NSDecimal::fromDouble(magnitude);
+    rest = seconds.remainder(NSDecimal(86400)).doubleValue();
+    days = seconds.integerDivide(NSDecimal(86400)).toString();
+  }
+  const auto hours = static_cast<int>(rest / 3600);
+  const auto minutes = static_cast<int>(std::fmod(rest, 3600) / 60);
+  const double seconds = std::fmod(rest, 60);
   std::string text = value < 0 ? "-P" : "P";
-  if (days) text += std::to_string(days) + "D";
-  if (hours || minutes || rest != 0) text += "T";
+  if (days != "0") text += days + "D";
+  if (rest != 0) text += "T";
   if (hours) text += std::to_string(hours) + "H";
   if (minutes) text += std::to_string(minutes) + "M";
-  if (rest != 0) {
-    const bool whole = rest == std::trunc(rest);
-    text += (whole ? std::to_string(wholePart(rest)) : formatDouble(rest)) + "S";
+  if (seconds != 0) {
+    const bool whole = seconds == std::trunc(seconds);
+    text += (whole ? std::to_string(static_cast<int>(seconds)) : formatDouble(seconds)) + "S";
   }
-  if (!days && !hours && !minutes && rest == 0) text += "T0S";
+  if (days == "0" && rest == 0) text += "T0S";
   return text;
 }
 

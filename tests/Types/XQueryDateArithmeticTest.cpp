@@ -337,15 +337,29 @@ TEST_F(LocalArithmetic, WithoutAZoneTheLocalOneDecides) {
   EXPECT_IN_ZONE("America/New_York", sum(22, "2024-05-10", "PT23H"), "2024-05-10");
 }
 
-// A time without a zone is an instant by the local clock, but its sum is read in GMT.
-TEST_F(LocalArithmetic, ASumOfATimeWithoutAZoneIsReadInGMT) {
-  EXPECT_IN_ZONE("UTC", sum(23, "23:30:00", "PT1H"), "00:30:00");
-  EXPECT_IN_ZONE("UTC", sum(23, "00:30:00", "-PT1H"), "23:30:00");
-  EXPECT_IN_ZONE("UTC", sum(23, "12:00:00", "P3DT1H"), "13:00:00");
-  EXPECT_IN_ZONE("Europe/Berlin", sum(23, "23:30:00", "PT1H"), "23:30:00");
-  EXPECT_IN_ZONE("Asia/Kathmandu", sum(23, "12:00:00", "PT1H"), "07:15:00");
+// Of a time without a zone the zone of the process does not show.
+TEST_F(LocalArithmetic, ASumOfATimeWithoutAZoneIsTheSameInEveryZone) {
+  constexpr Row rows[] = {
+      {"23:30:00", "PT1H", "00:30:00"},          {"00:30:00", "-PT1H", "23:30:00"},
+      {"12:00:00", "P3DT1H", "13:00:00"},        {"02:30:00", "P1D", "02:30:00"},
+      {"12:00:00", "PT1.5S", "12:00:01.500000"}, {"01:59:59", "PT1S", "02:00:00"},
+  };
+  for (const char* zone : {"UTC", "Europe/Berlin", "America/New_York", "Asia/Kathmandu"}) {
+    const auto sums = [&] {
+      std::string text;
+      for (const Row& row : rows) text += sum(23, row.date, row.duration) + " ";
+      return text;
+    };
+    std::string expected;
+    for (const Row& row : rows) expected += std::string(row.sum) + " ";
+    EXPECT_IN_ZONE(zone, sums(), expected);
+  }
+}
+
+TEST_F(LocalArithmetic, ASumOfATimeKeepsItsOwnZone) {
   EXPECT_IN_ZONE("Europe/Berlin", sum(23, "23:30:00Z", "PT1H"), "00:30:00Z");
   EXPECT_IN_ZONE("Europe/Berlin", sum(23, "23:30:00+01:00", "PT1H"), "00:30:00+01:00");
+  EXPECT_IN_ZONE("America/New_York", sum(23, "00:30:00+14:00", "-PT1H"), "23:30:00+14:00");
 }
 
 // --- differences ---------------------------------------------------------------------------------

@@ -60,7 +60,7 @@ TEST(XQueryDuration, PrintsItsNonZeroFieldsWithoutASign) {
       {"P400D", "P400D"},
       {"P001Y", "P1Y"},
       {"P2147483647Y2147483647M2147483647D", "P2147483647Y2147483647M2147483647D"},
-      {"PT9223372036854775807S", "PT9.223372036854776e+18S"},
+      {"PT9223372036854775807S", "PT9223372036854775807S"},
       {"PT1000000000000S", "PT1000000000000S"},
       // A fraction is read as an integer, which loses its leading zeros.
       {"PT1.05S", "PT1.5S"},
