@@ -19,11 +19,24 @@
 
 namespace xquery {
 
+// Kinds of addresses that are no servers of the public network.
+enum class XQueryAddressKind : uint8_t {
+  Loopback,   // this machine: 127.0.0.0/8, ::1, and the unspecified address, which leads here too
+  LinkLocal,  // neighbours: 169.254.0.0/16, fe80::/10; where clouds tell machines their secrets
+  Private,    // 10.0.0.0/8, 172.16.0.0/12, 192.168.0.0/16, 100.64.0.0/10, fc00::/7 and the like
+  Special,    // multicast, broadcast, reserved, for documentation
+};
+
 // Which URLs may be loaded. It is asked about every URL, of whatever purpose, before anything is
 // fetched, and about the target of every redirect. Schemes are compared ignoring case. A redirect
 // never leads from the network to a file, and a URL without a scheme is never loaded.
 //
 //   auto policy = XQueryLoadingPolicy::denyAll().allowFilesBelow("/srv/data").allowScheme("https");
+//
+// A program that fetches for strangers says which servers are meant, or which are not:
+//
+//   policy.allowHost("data.example.org").allowHost("*.example.com");
+//   policy.forbidLocalAddresses();
 class XQUERY_EXPORT XQueryLoadingPolicy {
  public:
   // Any file, http and https URL.
@@ -33,19 +46,56 @@ class XQUERY_EXPORT XQueryLoadingPolicy {
   // Any URL of that scheme. The library itself fetches file, http and https; another scheme is of
   // use to a loader of the host's own.
   XQueryLoadingPolicy& allowScheme(std::string_view scheme);
-  // Files in that folder and in the folders under it, wherever their links and ".." lead: the place
-  // of the file that is really opened counts. The folder must exist by now; one that does not
-  // allows nothing.
+  // Files in that folder and in the folders under it. The folder must exist by now; one that does
+  // not allows nothing.
+  //
+  // A path is judged by its text first, "." and ".." removed as RFC 3986 does it: it has to begin
+  // with the folder as it is given here, or as it is without links. Of any other path nothing is
+  // looked at, so that no answer tells what exists elsewhere. Links below the folder are followed
+  // where they lead to a place below an allowed folder, and are refused otherwise.
   XQueryLoadingPolicy& allowFilesBelow(const std::string& folder);
 
+  // From the first call on, of URLs with a host only those of the hosts named, whatever the scheme
+  // but file; their schemes have to be allowed as well. Names are compared ignoring case and as
+  // the URL writes them: a name and an address are different hosts. Ports do not matter.
+  // "*.example.org" stands for every name that ends in ".example.org".
+  XQueryLoadingPolicy& allowHost(std::string_view name);
+  // Nothing is fetched from a server whose address is of that kind, by whatever name: the address
+  // counts that the library is about to connect to, so that names which change their meaning do
+  // not matter, nor do redirects. No proxy is used from then on, since only it would know the
+  // address. A loader of the host's own has to see to this by itself.
+  XQueryLoadingPolicy& forbidAddresses(XQueryAddressKind kind);
+  // Of every kind.
+  XQueryLoadingPolicy& forbidLocalAddresses();
+
+  // Whether a URL may be asked for. What it names may still be refused when it is opened or
+  // connected to.
   bool allowsURL(const NSURL& URL) const;
   // Whether the place is in one of the folders; an absolute path without links and "..".
   bool isBelowAllowedFolder(std::string_view canonicalPath) const;
   bool allowsScheme(std::string_view scheme) const;
+  bool allowsHost(std::string_view name) const;
+  bool forbidsAddresses(XQueryAddressKind kind) const;
+
+  // A path below one of the folders: the folder, without links, and the way from there on.
+  struct Place {
+    std::string folder;  // empty for the root, otherwise without a slash at the end
+    std::string path;    // relative, as it is in the path asked about
+  };
+  // By the text of an absolute path without "." and ".."; nothing when it is below none.
+  std::optional<Place> placeBelowFolder(std::string_view path) const;
 
  private:
+  struct Folder {
+    std::string spelling;  // as given; like `place` otherwise
+    std::string place;     // canonical; the root is empty, the others without a slash
+  };
+  bool allowsHostOf(const NSURL& URL) const;
+
   std::vector<std::string> _schemes;  // in lower case
-  std::vector<std::string> _folders;  // canonical; the root is empty, the others without a slash
+  std::vector<Folder> _folders;
+  std::vector<std::string> _hosts;  // in lower case; any when there are none
+  uint8_t _forbiddenAddresses = 0;  // a bit for each kind
 };
 
 struct XQueryLoadingLimits {
@@ -79,8 +129,18 @@ struct XQueryResource {
 };
 
 // A host's own way to fetch, in place of the library's, for every purpose. It is called for the
-// URLs that the policy allows and on the thread that evaluates or compiles; one loader given to
-// several contexts must be safe to call from several threads. What it throws passes through.
+// URLs that the policy allows. One loader given to several contexts must be safe to call from
+// several threads.
+//
+// It is called on the thread that evaluates or compiles, unless that has limits: then it is called
+// on a thread of its own, and that is waited for. A loader that does not answer in time is left
+// behind: the evaluation ends as at any limit, and what the loader answers later is dropped. So it
+// must not refer to anything that may be gone by then, such as the context; it itself is kept until
+// it has answered. While more than a few calls are left behind the next one waits for its turn. An
+// evaluation inside a loader that is called on a thread of its own has no limits but its own.
+//
+// What it throws passes through to the caller of the evaluation, as it was thrown: it is no failure
+// to find the resource, and its std::bad_alloc is none of the engine's limits.
 //
 //   class Archive : public XQueryLoader {
 //     std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose) override {

@@ -3,6 +3,7 @@
 #include "Context/LimitWatch.h"
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
+#include "Platform/Base/HostFailure.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
@@ -69,9 +70,11 @@ XQueryInnerResult XQueryEvaluateInnerQuery(const Ref<NSString>& source, const Va
   const Ref<XQueryContext> context = XQueryNestedContext(outer);
   XQueryLoading loading = context->contextLoading();
   loading.moduleURL = moduleURLOf(outer);
-  const Ref<XQuery> query = XQuery::xqueryWithSource(source, loading);
   XQueryInnerResult result;
-  result.items = context->evaluateXQuery(*query, {}, contextItem, &result.error);
+  passingOnHostFailures([&] {
+    const Ref<XQuery> query = XQuery::xqueryWithSource(source, loading);
+    result.items = context->evaluateXQuery(*query, {}, contextItem, &result.error);
+  });
   if (XQueryIsLimit(result.error.get())) outer._internal().raise(result.error);
   return result;
 }

@@ -6,6 +6,7 @@
 #include "Context/XQueryGlobals.h"
 #include "Engine/XQueryInternal.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/Base/HostFailure.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Tree/Arena.h"
 #include "Prolog/XQueryProlog.h"
@@ -48,9 +49,10 @@ Internal compiledWithin(const XQueryLimits& limits, const std::function<Internal
 
 // Without limits of its own a compilation that is part of an evaluation ends with that one.
 Internal compiled(const XQueryLimits& limits, const std::function<Internal()>& compile) {
-  if (isLimited(limits)) return compiledWithin(limits, compile);
   try {
-    return compile();
+    return isLimited(limits) ? compiledWithin(limits, compile) : compile();
+  } catch (const HostFailure& failure) {
+    failure.giveBack();
   } catch (const std::bad_alloc&) {
     lookAtWork();
     return failed(XQueryErrors::outOfMemory.error());
@@ -154,7 +156,7 @@ void XQueryContext::contextAddClientSelector(std::string_view, std::string_view)
 
 void XQueryContext::_traceValue(const Value& value, const Ref<NSString>& forLabel) {
   if (const auto client = _private->client()) {
-    client->XQueryClientTraceValue(value, forLabel, *this);
+    passingOnHostFailures([&] { client->XQueryClientTraceValue(value, forLabel, *this); });
   } else if (XQueryLogEnabled()) {
     NSLog(XQueryDescription(forLabel.get())->utf8() + " " + XQueryDescription(value.get())->utf8());
   }
@@ -232,6 +234,8 @@ Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
   } catch (const std::length_error&) {
     // Only decimals throw it.
     return XQueryErrors::tooManyDigits.error();
+  } catch (const HostFailure& failure) {
+    failure.giveBack();
   }
 }
 

@@ -1,13 +1,18 @@
 // Documents and raw bodies of a context, and what a compilation may load.
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Platform/Loading/HTTPServer.h"
 #include "Platform/Loading/LoadingTestSupport.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>
 
+#include <future>
 #include <map>
+#include <memory>
+#include <new>
+#include <stdexcept>
 #include <string>
 #include <thread>
 #include <vector>
@@ -113,6 +118,20 @@ TEST_F(Loading, StatusesOfAServerAreFilteredAlike) {
     EXPECT_EQ(document(server.URL(path)), "(empty)") << status;
     EXPECT_EQ(body(server.URL(path + "?body")), "(none)") << status;
   }
+}
+
+TEST_F(Loading, WhatIsRememberedCounts) {
+  setPolicy(XQueryLoadingPolicy::denyAll());
+  constexpr int count = 2000;
+  // A text, a URL, and its place in a table.
+  constexpr int64_t leastBytes = 100;
+  const int64_t before = workMeter.valueBytes;
+  for (int index = 0; index < count; ++index) {
+    EXPECT_EQ(document("http://h/" + std::to_string(index)), "(empty)");
+  }
+  EXPECT_GE(workMeter.valueBytes - before, count * leastBytes);
+  context = nullptr;
+  EXPECT_LT(workMeter.valueBytes - before, count);
 }
 
 TEST_F(Loading, TextThatIsNotWellFormedIsEmpty) {
@@ -307,6 +326,11 @@ class Archive : public XQueryLoader {
 
 class HostLoading : public Loading {
  protected:
+  static Ref<XQueryContext> XQueryContextWith(const XQueryLoading& loading) {
+    auto made = XQueryContext::xqueryContext();
+    made->contextSetLoading(loading);
+    return made;
+  }
   void SetUp() override {
     settings.loader = archive;
     settings.policy = XQueryLoadingPolicy::denyAll().allowScheme("app");
@@ -359,6 +383,54 @@ TEST_F(HostLoading, WhatItThrowsPassesThrough) {
   archive->onLoad = nullptr;
   archive->entries["app:d"] = {"<d/>", {}, {}, {}};
   EXPECT_EQ(document("app:d"), "<d/>") << "a load that was broken off is no failure to remember";
+}
+
+// Inside the engine these mean that it has no memory, or a decimal too many digits.
+TEST_F(HostLoading, ItsFailuresAreNotTakenForTheEnginesOwn) {
+  const std::string inner =
+      "declare namespace x = "
+      "'http://libxquery.example/xquery/2004/10/functions'; ";
+  const std::string queries[] = {"doc('app:d')", "some $d in doc('app:d') satisfies number($d) = 1",
+                                 inner + "x:eval(\"doc('app:d')\")", inner + "x:uri-body('app:d')",
+                                 inner + "x:xslt-uri(document { <a/> }, 'app:d')"};
+  const auto throwing = [&](auto failure, const std::string& query) {
+    archive->onLoad = [failure] { throw failure; };
+    const auto compiled = XQuery::xqueryWithSource(std::string_view(query), settings);
+    EXPECT_THROW((void)XQueryContextWith(settings)->evaluateXQuery(*compiled, {}, {}),
+                 decltype(failure))
+        << query;
+    EXPECT_THROW((void)XQuery::xqueryWithSource(
+                     std::string_view("import module 'urn:m' at 'app:m'; 1"), settings),
+                 decltype(failure));
+  };
+  for (const std::string& query : queries) {
+    throwing(std::bad_alloc(), query);
+    throwing(std::length_error("mine"), query);
+  }
+}
+
+TEST_F(HostLoading, IsNotWaitedForBeyondADeadline) {
+  // Answers when the test is over.
+  struct Silent : XQueryLoader {
+    std::shared_future<void> end;
+    std::optional<XQueryResource> load(const NSURL&, XQueryLoadPurpose) override {
+      end.wait();
+      return std::nullopt;
+    }
+  };
+  std::promise<void> end;
+  const auto silent = std::make_shared<Silent>();
+  silent->end = end.get_future().share();
+  settings.loader = silent;
+  XQueryLimits limits;
+  limits.duration = milliseconds(50);
+  const auto waiting = XQueryContextWith(settings);
+  waiting->contextSetLimits(limits);
+  const auto query = XQuery::xqueryWithSource(std::string_view("doc('app:d')"));
+  Ref<XQueryError> error;
+  EXPECT_FALSE(waiting->evaluateXQuery(*query, {}, {}, &error));
+  EXPECT_EQ(error->msg()->utf8(), "limit: deadline passed");
+  end.set_value();
 }
 
 // --- what a compilation may load -----------------------------------------------------------------

@@ -1,6 +1,6 @@
 #include "Platform/Loading/Curl.h"
 
-#include "Platform/Base/WorkMeter.h"
+#include "Platform/Loading/GatheredBytes.h"
 
 #include <curl/curl.h>
 
@@ -8,6 +8,7 @@
 #include <memory>
 #include <mutex>
 #include <new>
+#include <sys/socket.h>
 
 namespace xquery {
 
@@ -26,8 +27,7 @@ struct CleanUpEasy {
 };
 
 // One request. Exceptions do not cross libcurl's C frames: a callback notes what went wrong and
-// refuses its piece, which ends the transfer. What has come counts as memory while it is gathered,
-// so that the checkpoint sees a body that takes more than it may.
+// refuses its piece, which ends the transfer.
 class Transfer {
  public:
   explicit Transfer(const CurlRequest& request)
@@ -36,7 +36,6 @@ class Transfer {
   }
   ~Transfer() {
     if (_isAdded) curl_multi_remove_handle(_multi.get(), _easy.get());
-    uncountValueBytes(_countedBytes);
   }
   Transfer(const Transfer&) = delete;
   Transfer& operator=(const Transfer&) = delete;
@@ -53,15 +52,17 @@ class Transfer {
 
   static size_t hearBody(char* bytes, size_t size, size_t count, void* self);
   static size_t hearHeader(char* bytes, size_t size, size_t count, void* self);
+  static curl_socket_t openSocket(void* self, curlsocktype, curl_sockaddr* address);
 
   const CurlRequest& _request;
   const std::unique_ptr<CURLM, CleanUpMulti> _multi;
   const std::unique_ptr<CURL, CleanUpEasy> _easy;
   bool _isAdded = false;
   CurlResponse _response;
+  GatheredBytes _body;
   size_t _headerBytes = 0;
-  size_t _countedBytes = 0;
   bool _isTooLong = false;
+  bool _isForbidden = false;
   bool _isOutOfMemory = false;
   char _message[CURL_ERROR_SIZE] = {};
 };
@@ -69,19 +70,16 @@ class Transfer {
 size_t Transfer::hearBody(char* bytes, size_t size, size_t count, void* self) {
   auto& transfer = *static_cast<Transfer*>(self);
   const size_t length = size * count;
-  std::string& data = transfer._response.data;
-  if (length > transfer._request.mostBytes - data.size()) {
+  if (length > transfer._request.mostBytes - transfer._body.size()) {
     transfer._isTooLong = true;
     return CURL_WRITEFUNC_ERROR;
   }
   try {
-    data.append(bytes, length);
+    transfer._body.append({bytes, length});
   } catch (const std::bad_alloc&) {
     transfer._isOutOfMemory = true;
     return CURL_WRITEFUNC_ERROR;
   }
-  countValueBytes(length);
-  transfer._countedBytes += length;
   return length;
 }
 
@@ -91,6 +89,16 @@ size_t Transfer::hearHeader(char*, size_t size, size_t count, void* self) {
   if (transfer._headerBytes <= mostHeaderBytes) return size * count;
   transfer._isTooLong = true;
   return CURL_WRITEFUNC_ERROR;
+}
+
+// The address is that which the name stands for now, and which the connection will have.
+curl_socket_t Transfer::openSocket(void* self, curlsocktype, curl_sockaddr* address) {
+  auto& transfer = *static_cast<Transfer*>(self);
+  if (!transfer._request.allowsAddress(address->addr)) {
+    transfer._isForbidden = true;
+    return CURL_SOCKET_BAD;
+  }
+  return ::socket(address->family, address->socktype | SOCK_CLOEXEC, address->protocol);
 }
 
 void Transfer::configure() {
@@ -114,6 +122,10 @@ void Transfer::configure() {
   curl_easy_setopt(easy, CURLOPT_WRITEDATA, this);
   curl_easy_setopt(easy, CURLOPT_HEADERFUNCTION, &Transfer::hearHeader);
   curl_easy_setopt(easy, CURLOPT_HEADERDATA, this);
+  if (!_request.allowsAddress) return;
+  curl_easy_setopt(easy, CURLOPT_PROXY, "");
+  curl_easy_setopt(easy, CURLOPT_OPENSOCKETFUNCTION, &Transfer::openSocket);
+  curl_easy_setopt(easy, CURLOPT_OPENSOCKETDATA, this);
 }
 
 bool Transfer::perform() {
@@ -138,7 +150,9 @@ CURLcode Transfer::outcome() {
 }
 
 std::string Transfer::reason(CURLcode code) const {
-  if (_isTooLong) return "more bytes than allowed";
+  // A line of a header that is longer than it takes is out of memory to libcurl.
+  if (_isTooLong || code == CURLE_OUT_OF_MEMORY) return "more bytes than allowed";
+  if (_isForbidden) return "its address is not allowed";
   return _message[0] ? _message : curl_easy_strerror(code);
 }
 
@@ -159,12 +173,13 @@ void Transfer::describeResponse() {
 std::optional<CurlResponse> Transfer::run(std::string& failure) {
   configure();
   const CURLcode code = perform() ? outcome() : CURLE_FAILED_INIT;
-  if (_isOutOfMemory || code == CURLE_OUT_OF_MEMORY) throw std::bad_alloc();
+  if (_isOutOfMemory) throw std::bad_alloc();
   if (code != CURLE_OK) {
     failure = reason(code);
     return std::nullopt;
   }
   describeResponse();
+  _response.data = _body.take();
   return std::move(_response);
 }
 

@@ -7,6 +7,8 @@
 #include <optional>
 #include <string>
 
+struct sockaddr;
+
 namespace xquery {
 
 struct CurlRequest {
@@ -14,6 +16,9 @@ struct CurlRequest {
   std::chrono::milliseconds connectTimeout;
   std::chrono::milliseconds totalTimeout;
   uint64_t mostBytes;
+  // Asked before each connection; without it any address is connected to, or a proxy. It must not
+  // throw.
+  std::function<bool(const sockaddr&)> allowsAddress;
   // Called at least every 50 ms while the request lasts. What it throws ends the request and passes
   // through.
   std::function<void()> checkpoint;

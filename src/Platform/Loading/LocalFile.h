@@ -9,9 +9,10 @@
 
 namespace xquery {
 
-// Reads a whole file of at most `mostBytes`. Only regular files are read: opening a pipe or reading
-// a device might never end. The policy judges the file that was opened, so that no link put in
-// place meanwhile leads elsewhere. Nothing, and why in `failure`, when it cannot be had.
+// Reads a whole file of at most `mostBytes`. Only regular files are read, and nothing else is even
+// opened: that of a pipe or a device might never end. Below allowed folders, no link leads out of
+// them, whenever it is put in place. The system has to have /proc. Nothing, and why in `failure`,
+// when the file cannot be had.
 std::optional<std::string> readLocalFile(const NSURL& URL, const XQueryLoadingPolicy& policy,
                                          uint64_t mostBytes, std::string& failure);
 

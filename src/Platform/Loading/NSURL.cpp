@@ -1,3 +1,4 @@
+#include "Platform/Loading/PercentEscapes.h"
 #include "Platform/Loading/URIParser.h"
 #include "Platform/Text/ASCII.h"
 #include "xquery/URL.h"
@@ -32,25 +33,6 @@ Parts partsOf(const NSString& reference) {
   }
   parts.path = rest;
   return parts;
-}
-
-int hexadecimalDigit(char digit) {
-  if (digit >= '0' && digit <= '9') return digit - '0';
-  return lowerCase(digit) - 'a' + 10;
-}
-
-std::string unescaped(std::string_view text) {
-  std::string out;
-  for (size_t index = 0; index < text.size(); ++index) {
-    char byte = text[index];
-    if (byte == '%' && index + 2 < text.size()) {
-      byte = static_cast<char>(hexadecimalDigit(text[index + 1]) * 16 +
-                               hexadecimalDigit(text[index + 2]));
-      index += 2;
-    }
-    out += byte;
-  }
-  return out;
 }
 
 // What a path may hold as it is, of the characters that a URL allows there.

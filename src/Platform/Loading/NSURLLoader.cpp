@@ -1,7 +1,9 @@
 #include "Platform/Loading/NSURLLoader.h"
 
 #include "Platform/Base/NSLog.h"
+#include "Platform/Loading/AddressKinds.h"
 #include "Platform/Loading/Curl.h"
+#include "Platform/Loading/HostLoad.h"
 #include "Platform/Loading/LocalFile.h"
 
 #include <algorithm>
@@ -23,7 +25,32 @@ std::optional<std::string> MIMETypeOf(const std::optional<std::string>& contentT
   return std::string(type);
 }
 
+bool forbidsAddresses(const XQueryLoadingPolicy& policy) {
+  using Kind = XQueryAddressKind;
+  constexpr Kind kinds[] = {Kind::Loopback, Kind::LinkLocal, Kind::Private, Kind::Special};
+  return std::any_of(std::begin(kinds), std::end(kinds),
+                     [&](Kind kind) { return policy.forbidsAddresses(kind); });
+}
+
+// Empty where any is allowed.
+std::function<bool(const sockaddr&)> addressRuleOf(const XQueryLoadingPolicy& policy) {
+  if (!forbidsAddresses(policy)) return nullptr;
+  return [&policy](const sockaddr& address) {
+    const auto kind = kindOfAddress(address);
+    return !kind || !policy.forbidsAddresses(*kind);
+  };
+}
+
 }  // namespace
+
+std::string withoutCredentials(std::string_view URL) {
+  const size_t start = URL.find("//");
+  if (start == URL.npos) return std::string(URL);
+  const size_t end = std::min(URL.find_first_of("/?#", start + 2), URL.size());
+  const size_t at = URL.substr(0, end).rfind('@');
+  if (at == URL.npos || at < start) return std::string(URL);
+  return std::string(URL.substr(0, start + 2)).append(URL.substr(at + 1));
+}
 
 Ref<NSURLLoader> NSURLLoader::loaderWithLoading(XQueryLoading loading) {
   return make<NSURLLoader>(std::move(loading));
@@ -41,7 +68,7 @@ std::optional<XQueryResource> NSURLLoader::load(const NSURL& URL, XQueryLoadPurp
   _failure.clear();
   auto resource = loadAllowed(URL, purpose);
   if (!resource && XQueryLogEnabled()) {
-    NSLog("cannot load " + URL.absoluteString()->utf8() + ": " + _failure);
+    NSLog("cannot load " + withoutCredentials(URL.absoluteString()->utf8()) + ": " + _failure);
   }
   return resource;
 }
@@ -64,7 +91,7 @@ std::optional<XQueryResource> NSURLLoader::loadFromHost(const NSURL& URL,
                                                         XQueryLoadPurpose purpose) {
   // The host may set other settings, and so take its loader away, while it is called.
   const std::shared_ptr<XQueryLoader> loader = _loading.loader;
-  auto resource = loader->load(URL, purpose);
+  auto resource = xquery::loadFromHost(loader, URL, purpose, _checkpoint);
   if (!resource) _failure = "the host has no such resource";
   if (resource && resource->data.size() > _loading.limits.mostBytes) {
     _failure = "more bytes than allowed";
@@ -90,11 +117,20 @@ std::optional<XQueryResource> NSURLLoader::loadFromServer(const NSURL& URL) {
   using Clock = std::chrono::steady_clock;
   using std::chrono::milliseconds;
   const XQueryLoadingLimits& limits = _loading.limits;
+  // What libcurl would take for the host then is not what the policy was asked about.
+  if (URL.host().empty()) {
+    _failure = "no host";
+    return std::nullopt;
+  }
   // The end of a very long time is beyond what the clock counts, so what is left is counted.
   const milliseconds total = std::max(limits.totalTimeout, milliseconds::zero());
   const auto start = Clock::now();
-  CurlRequest request = {URL.absoluteString()->utf8(), limits.connectTimeout, total,
-                         limits.mostBytes, _checkpoint};
+  CurlRequest request = {URL.absoluteString()->utf8(),
+                         limits.connectTimeout,
+                         total,
+                         limits.mostBytes,
+                         addressRuleOf(_loading.policy),
+                         _checkpoint};
   for (int redirects = 0;; ++redirects) {
     auto response = fetchWithCurl(request, _failure);
     if (!response) return std::nullopt;
@@ -107,7 +143,8 @@ std::optional<XQueryResource> NSURLLoader::loadFromServer(const NSURL& URL) {
       return std::nullopt;
     }
     if (!mayFollow(response->redirectURL)) {
-      _failure = "redirected to " + response->redirectURL + ", which is not allowed";
+      _failure =
+          "redirected to " + withoutCredentials(response->redirectURL) + ", which is not allowed";
       return std::nullopt;
     }
     request.URL = std::move(response->redirectURL);

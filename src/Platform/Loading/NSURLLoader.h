@@ -10,6 +10,7 @@
 #include <functional>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <unordered_map>
 
 namespace xquery {
@@ -20,10 +21,15 @@ struct NSURLHash {
 struct NSURLEqual {
   bool operator()(const Ref<NSURL>& a, const Ref<NSURL>& b) const { return a->isEqual(*b); }
 };
+// Counts toward the memory ceiling, since what could not be had is remembered as well.
 template <class T>
-using NSURLTable = std::unordered_map<Ref<NSURL>, T, NSURLHash, NSURLEqual>;
+using NSURLTable = std::unordered_map<Ref<NSURL>, T, NSURLHash, NSURLEqual,
+                                      ValueAllocator<std::pair<const Ref<NSURL>, T>>>;
 
 class NSURLLoader;
+
+// A URL as it may be shown: without the user name and the password that it may hold.
+std::string withoutCredentials(std::string_view URL);
 
 // The bytes behind a URL, fetched when they are first asked for.
 class NSURLHandle : public NSCounted {
@@ -51,8 +57,8 @@ class NSURLLoader : public NSCounted {
   [[nodiscard]] static Ref<NSURLLoader> loaderWithLoading(XQueryLoading loading = {});
 
   const XQueryLoading& loading() const { return _loading; }
-  // Called at least every 50 ms while the network is waited for; unless another is set, the one
-  // that ends an evaluation at its limits. What it throws ends the load and passes through.
+  // Called at least every 50 ms while the network or the host is waited for; unless another is set,
+  // the one that ends an evaluation at its limits. What it throws ends the load and passes through.
   void setCheckpoint(std::function<void()> checkpoint) { _checkpoint = std::move(checkpoint); }
 
   // Nothing when the URL may not be loaded, when it cannot be reached, and past the limits. A

@@ -1,5 +1,7 @@
 #include "Platform/Stylesheets/Stylesheet.h"
 
+#include "Platform/Base/HostFailure.h"
+#include "Platform/Loading/GatheredBytes.h"
 #include "Platform/Stylesheets/LibXSLT.h"
 #include "xquery/Error.h"
 #include "xquery/Loading.h"
@@ -20,14 +22,15 @@ Ref<NSXMLDocument> load(const NSURL& URL, XQueryLoadPurpose purpose, NSURLLoader
                         std::string& failure) {
   const auto resource = loader.load(URL, purpose);
   if (!resource || !NSURLLoader::hasUsableStatus(*resource)) {
-    failure = "cannot load " + URL.absoluteString()->utf8();
+    failure = "cannot load " + withoutCredentials(URL.absoluteString()->utf8());
     return nullptr;
   }
+  const CountedBytes counted(resource->data.size());
   NSXMLParseError error;
   const auto document = NSXMLDocument::documentWithData(resource->data, options, &error);
   if (!document) {
-    failure = URL.absoluteString()->utf8() + ", line " + std::to_string(error.line) + ": " +
-              error.message;
+    failure = withoutCredentials(URL.absoluteString()->utf8()) + ", line " +
+              std::to_string(error.line) + ": " + error.message;
   }
   return document;
 }
@@ -59,6 +62,8 @@ Value valueOrError(Make make, const XQueryLoading& loading, Ref<NSError>* error)
   Value value;
   try {
     value = make(*NSURLLoader::loaderWithLoading(loading), failure);
+  } catch (const HostFailure& hostFailure) {
+    hostFailure.giveBack();
   } catch (const std::bad_alloc&) {
     failure = "out of memory";
   }

@@ -63,26 +63,93 @@ TEST(LoadingPolicy, DotsDoNotLeadOutOfAFolder) {
   folder.write("secret.xml", "<s/>");
   const Policy policy = Policy::denyAll().allowFilesBelow(folder.path("data"));
   for (const auto* way : {"data/../secret.xml", "data/%2e%2e/secret.xml", "data/..%2Fsecret.xml",
-                          "data/x/../../secret.xml", "data//..//secret.xml"}) {
+                          "data/x/../../secret.xml", "data//..//secret.xml", "data/.%2e/secret.xml",
+                          "data/../../../../../../secret.xml"}) {
     EXPECT_FALSE(allows(policy, folder.URL(way))) << way;
   }
   EXPECT_TRUE(allows(policy, folder.URL("data/../data/a.xml")));
 }
 
-TEST(LoadingPolicy, LinksCountForWhereTheyLead) {
+TEST(LoadingPolicy, LinksBelowAFolderCountForWhereTheyLead) {
   TestFolder folder;
   folder.write("data/a.xml", "<a/>");
   folder.write("secret/s.xml", "<s/>");
   std::filesystem::create_symlink(folder.path("secret/s.xml"), folder.path("data/link.xml"));
   std::filesystem::create_symlink(folder.path("secret"), folder.path("data/folder"));
-  std::filesystem::create_symlink(folder.path("data"), folder.path("way-in"));
+  std::filesystem::create_symlink(folder.path("data/a.xml"), folder.path("data/fine.xml"));
   const Policy policy = Policy::denyAll().allowFilesBelow(folder.path("data"));
   EXPECT_FALSE(allows(policy, folder.URL("data/link.xml")));
   EXPECT_FALSE(allows(policy, folder.URL("data/folder/s.xml")));
-  EXPECT_TRUE(allows(policy, folder.URL("way-in/a.xml")));
-  // A link given as the folder stands for the folder that it leads to.
+  EXPECT_TRUE(allows(policy, folder.URL("data/fine.xml")));
+}
+
+TEST(LoadingPolicy, AFolderGivenByALinkIsKnownByBothNames) {
+  TestFolder folder;
+  folder.write("data/a.xml", "<a/>");
+  std::filesystem::create_symlink(folder.path("data"), folder.path("way-in"));
   const Policy linked = Policy::denyAll().allowFilesBelow(folder.path("way-in"));
+  EXPECT_TRUE(allows(linked, folder.URL("way-in/a.xml")));
   EXPECT_TRUE(allows(linked, folder.URL("data/a.xml")));
+  // Otherwise a link from elsewhere is elsewhere, so that nothing tells what is there.
+  const Policy policy = Policy::denyAll().allowFilesBelow(folder.path("data"));
+  EXPECT_FALSE(allows(policy, folder.URL("way-in/a.xml")));
+}
+
+// Whether the way there exists must not show.
+TEST(LoadingPolicy, ThePathCountsByItsTextWhateverExistsElsewhere) {
+  TestFolder folder;
+  folder.write("data/a.xml", "<a/>");
+  folder.write("there/x", "");
+  const Policy policy = Policy::denyAll().allowFilesBelow(folder.path("data"));
+  for (const std::string way : {"there/..", "missing/..", "there/x/../..", "missing/x/../..",
+                                "there/x/%2E%2e/..", "missing/x/%2e./.."}) {
+    EXPECT_TRUE(allows(policy, folder.URL(way + "/data/a.xml"))) << way;
+    EXPECT_FALSE(allows(policy, folder.URL(way + "/there/x"))) << way;
+  }
+  EXPECT_TRUE(allows(policy, "file:///proc/1/../.." + folder.path("data/a.xml")));
+  EXPECT_TRUE(allows(policy, "file:///proc/0/../.." + folder.path("data/a.xml")));
+}
+
+// --- hosts ---------------------------------------------------------------------------------------
+
+TEST(LoadingPolicy, AnyHostIsAllowedUntilOneIsNamed) {
+  Policy policy = Policy::allowAll();
+  EXPECT_TRUE(allows(policy, "http://example.org/"));
+  policy.allowHost("Data.Example.org").allowHost("*.example.com").allowHost("[::1]");
+  for (const auto* URL :
+       {"http://data.example.org/", "https://DATA.example.org:8080/a",
+        "http://user@data.example.org", "http://data.example.org./", "http://a.example.com/",
+        "http://a.b.example.com/", "http://[::1]:80/", "file:///etc/hosts"}) {
+    EXPECT_TRUE(allows(policy, URL)) << URL;
+  }
+  for (const auto* URL :
+       {"http://example.org/", "http://a.data.example.org/", "http://example.com/",
+        "http://badexample.com/", "http://data.example.org.evil.net/", "http://127.0.0.1/",
+        "http://data.example.org@evil.net/", "http:///data.example.org/", "http:data.example.org",
+        "http://%64ata.example.org/"}) {
+    EXPECT_FALSE(allows(policy, URL)) << URL;
+  }
+}
+
+TEST(LoadingPolicy, HostsComeOnTopOfSchemes) {
+  const Policy policy = Policy::denyAll().allowScheme("https").allowHost("h").allowScheme("app");
+  EXPECT_TRUE(allows(policy, "https://h/"));
+  EXPECT_FALSE(allows(policy, "http://h/"));
+  EXPECT_TRUE(allows(policy, "app:anything")) << "a URL without a host";
+  EXPECT_FALSE(allows(policy, "app://elsewhere/"));
+}
+
+TEST(LoadingPolicy, AddressesAreForbiddenByKind) {
+  Policy policy = Policy::allowAll();
+  EXPECT_FALSE(policy.forbidsAddresses(XQueryAddressKind::Private));
+  policy.forbidAddresses(XQueryAddressKind::LinkLocal);
+  EXPECT_TRUE(policy.forbidsAddresses(XQueryAddressKind::LinkLocal));
+  EXPECT_FALSE(policy.forbidsAddresses(XQueryAddressKind::Private));
+  policy.forbidLocalAddresses();
+  for (const auto kind : {XQueryAddressKind::Loopback, XQueryAddressKind::LinkLocal,
+                          XQueryAddressKind::Private, XQueryAddressKind::Special}) {
+    EXPECT_TRUE(policy.forbidsAddresses(kind));
+  }
 }
 
 TEST(LoadingPolicy, AFolderThatIsNotThereAllowsNothing) {
