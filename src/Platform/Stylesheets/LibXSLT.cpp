@@ -3,6 +3,7 @@
 #include "Platform/Base/WorkerThread.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Stylesheets/LibXMLTree.h"
+#include "Platform/Stylesheets/StylesheetBounds.h"
 
 #include <libxml/globals.h>
 #include <libxml/parser.h>
@@ -76,9 +77,22 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
   void hear(const char* format, va_list arguments);
   void hear(const char* text);
   void noteNode();
-  void noteBytes(int64_t more) { _bytes.fetch_add(more, std::memory_order_relaxed); }
+  void noteBytes(int64_t more);
 
  private:
+  // As long as it lives, what libxml2 has taken is part of what the calling thread has taken, so
+  // that whatever looks at that sees all.
+  class TakenTogether {
+   public:
+    explicit TakenTogether(Transformation& transformation);
+    ~TakenTogether();
+    TakenTogether(const TakenTogether&) = delete;
+    TakenTogether& operator=(const TakenTogether&) = delete;
+
+   private:
+    Transformation& _transformation;
+  };
+
   struct Request {
     const char* URL;
     xmlDictPtr dictionary;
@@ -98,17 +112,26 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
   // On the calling thread.
   // Whether the thread is done; otherwise it is left behind.
   bool attend();
+  void copyTask();
   void look(Request* request);
   void answer(Request& request);
-  bool exceedsMemory() const;
   LibXMLDocument copyOf(const NSXMLDocument& document, size_t mostLevels, const std::string& URL,
                         xmlDictPtr dictionary = nullptr);
-  Value result() const;
+  // Null, and why in the failure, when it is more than may be compiled.
+  LibXMLDocument copyOfStylesheet(const NSXMLDocument& document, const std::string& URL,
+                                  xmlDictPtr dictionary = nullptr);
+  Value result();
 
   const LibXSLTTask& _task;  // not for the thread of the transformation
   const NSXMLDocument::XSLTArguments _arguments;
   std::vector<const char*> _argumentTexts;  // name and value by turns, and null
-  std::atomic<int64_t> _bytes = 0;          // taken from libxml2 less those given back
+  std::atomic<int64_t> _bytes = 0;          // taken by libxml2 less those given back
+  int64_t _mostBytes = INT64_MAX;           // of them
+  std::atomic<bool> _takesTooMuch = false;
+  bool _isTakenTogether = false;  // on the calling thread
+  int64_t _bytesTakenTogether = 0;
+  StylesheetBounds _bounds;
+  const char* _refusal = nullptr;  // why a stylesheet was not even compiled
   LibXMLDocument _document;
   LibXMLDocument _stylesheet;
   LibXMLDocument _result;
@@ -179,16 +202,11 @@ class Counting {
 };
 
 // Threads that nobody waits for any more. libxml2 releases what it shares when the process ends,
-// whoever still uses it: they are given a little time to be done with it, and where that is not
-// enough, the allocator stays ours, which makes libxml2 release nothing.
+// whoever still uses it, unless its memory comes from somebody else: where there are such threads
+// the allocator stays ours. Nor does the process wait for them.
 class LeftBehind {
  public:
   ~LeftBehind() {
-    constexpr auto pause = std::chrono::milliseconds(10);
-    constexpr int mostPauses = 1000;
-    for (int pauses = 0; count > 0 && pauses < mostPauses; ++pauses) {
-      std::this_thread::sleep_for(pause);
-    }
     if (count == 0) Counting::end();
   }
   std::atomic<int> count = 0;
@@ -368,13 +386,34 @@ void Transformation::noteNode() {
   stop();
 }
 
+// The block at hand is given nevertheless.
+void Transformation::noteBytes(int64_t more) {
+  const int64_t bytes = _bytes.fetch_add(more, std::memory_order_relaxed) + more;
+  if (current) {
+    if (bytes <= _mostBytes || _takesTooMuch.exchange(true)) return;
+    const std::lock_guard lock(_mutex);
+    stop();
+  } else if (_isTakenTogether) {
+    workMeter.valueBytes += more;
+    _bytesTakenTogether += more;
+  }
+}
+
 // --- on the calling thread -----------------------------------------------------------------------
 
-Transformation::Transformation(const LibXSLTTask& task)
-    : _task(task),
-      _arguments(task.arguments),
-      _document(copyOf(task.document, LibXSLTMostDocumentLevels, task.documentURL)),
-      _stylesheet(copyOf(task.stylesheet, LibXSLTMostStylesheetLevels, task.stylesheetURL)) {
+Transformation::TakenTogether::TakenTogether(Transformation& transformation)
+    : _transformation(transformation) {
+  _transformation._isTakenTogether = true;
+  _transformation._bytesTakenTogether = _transformation._bytes.load(std::memory_order_relaxed);
+  workMeter.valueBytes += _transformation._bytesTakenTogether;
+}
+
+Transformation::TakenTogether::~TakenTogether() {
+  workMeter.valueBytes -= _transformation._bytesTakenTogether;
+  _transformation._isTakenTogether = false;
+}
+
+Transformation::Transformation(const LibXSLTTask& task) : _task(task), _arguments(task.arguments) {
   for (const auto& [name, value] : _arguments) {
     _argumentTexts.push_back(name.c_str());
     _argumentTexts.push_back(value.c_str());
@@ -398,7 +437,7 @@ bool Transformation::attend() {
       _isEnding = true;
       lastMoment = Clock::now() + timeToStop;
     }
-    if (_isEnding || _nestsTooDeeply) stop();
+    if (_isEnding || _nestsTooDeeply || _takesTooMuch) stop();
     // Once it is ending, nothing that was asked for meanwhile is answered either.
     if (request || _isEnding) {
       _request = nullptr;
@@ -413,8 +452,12 @@ bool Transformation::attend() {
 
 void Transformation::look(Request* request) {
   if (_ended) return;
+  const TakenTogether together(*this);
   try {
-    if (exceedsMemory()) workMeter.wasRefused = true;  // which the watcher raises
+    // The watcher raises it.
+    if (_takesTooMuch || workMeter.valueBytes > workMeter.mostValueBytes) {
+      workMeter.wasRefused = true;
+    }
     lookAtWork();
     if (request) answer(*request);
   } catch (...) {
@@ -422,19 +465,29 @@ void Transformation::look(Request* request) {
   }
 }
 
-bool Transformation::exceedsMemory() const {
-  const WorkMeter& meter = workMeter;
-  if (meter.mostValueBytes == INT64_MAX) return false;
-  return _bytes.load(std::memory_order_relaxed) > meter.mostValueBytes - meter.valueBytes;
-}
-
 void Transformation::answer(Request& request) {
   if (++_loads > LibXSLTMostLoads) return;
   const Ref<NSXMLDocument> document = _task.load(request.URL, request.isStylesheet);
   if (!document) return;
-  const size_t mostLevels =
-      request.isStylesheet ? LibXSLTMostStylesheetLevels : LibXSLTMostDocumentLevels;
-  request.document = copyOf(*document, mostLevels, request.URL, request.dictionary);
+  request.document =
+      request.isStylesheet
+          ? copyOfStylesheet(*document, request.URL, request.dictionary)
+          : copyOf(*document, LibXSLTMostDocumentLevels, request.URL, request.dictionary);
+}
+
+void Transformation::copyTask() {
+  const TakenTogether together(*this);
+  _document = copyOf(_task.document, LibXSLTMostDocumentLevels, _task.documentURL);
+  _stylesheet = copyOfStylesheet(_task.stylesheet, _task.stylesheetURL);
+}
+
+LibXMLDocument Transformation::copyOfStylesheet(const NSXMLDocument& document,
+                                                const std::string& URL, xmlDictPtr dictionary) {
+  if (_bounds.admit(document)) {
+    return copyOf(document, LibXSLTMostStylesheetLevels, URL, dictionary);
+  }
+  _refusal = "the stylesheet is too large";
+  return nullptr;
 }
 
 LibXMLDocument Transformation::copyOf(const NSXMLDocument& document, size_t mostLevels,
@@ -447,7 +500,8 @@ LibXMLDocument Transformation::copyOf(const NSXMLDocument& document, size_t most
   return LibXMLDocumentFrom(document, mostLevels, URL, dictionary);
 }
 
-Value Transformation::result() const {
+Value Transformation::result() {
+  const TakenTogether together(*this);
   if (_hasTextResult) return textFromLibXML(*_result);
   return documentFromLibXML(*_result);
 }
@@ -460,10 +514,17 @@ std::string oneLine(std::string text) {
 }
 
 Value Transformation::run(std::string& failure) {
-  failure = "the document nests too deeply";
+  copyTask();
+  failure = _refusal ? _refusal : "the document nests too deeply";
   if (!_document || !_stylesheet) return nullptr;
+  while (leftBehind.count >= LibXSLTMostLeftBehind) {
+    lookAtWork();
+    std::this_thread::sleep_for(timeBetweenLooks);
+  }
   failure = "no thread can be started";
-  if (leftBehind.count >= LibXSLTMostLeftBehind) return nullptr;
+  if (workMeter.mostValueBytes != INT64_MAX) {
+    _mostBytes = workMeter.mostValueBytes - workMeter.valueBytes;
+  }
   pthread_t thread;
   _self = shared_from_this();
   if (!startWorkerThread(thread, stackBytes, start, this)) {
@@ -472,14 +533,18 @@ Value Transformation::run(std::string& failure) {
   }
   const bool isDone = attend();
   isDone ? pthread_join(thread, nullptr) : pthread_detach(thread);
+  if (_takesTooMuch) look(nullptr);
   if (_ended) std::rethrow_exception(std::exchange(_ended, nullptr));
   if (_result) return result();
   failure = _nestsTooDeeply ? "the result nests too deeply" : oneLine(std::move(_failure));
+  if (_refusal) failure = _refusal;
   if (failure.empty()) failure = "the stylesheet failed";
   return nullptr;
 }
 
 }  // namespace
+
+std::atomic<int> LibXSLTMostLeftBehind = 16;
 
 Value transformWithLibXSLT(const LibXSLTTask& task, std::string& failure) {
   static std::once_flag initialised;
