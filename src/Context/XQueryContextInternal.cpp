@@ -10,6 +10,8 @@
 #include "xquery/Collection.h"
 
 #include <atomic>
+#include <new>
+#include <utility>
 
 namespace xquery {
 
@@ -135,17 +137,51 @@ const Ref<XQueryDate>& XQueryContextInternal::currentDateTime() {
   return _currentDateTime;
 }
 
-void XQueryContextInternal::setError(Ref<XQueryError> error, bool raiseException) {
-  _error = std::move(error);
-  if (!raiseException) return;
-  const Ref<NSString> reason = _error ? _error->description() : Ref<NSString>();
-  if (!XQueryLogEnabled()) throw NSException("XQueryError", reason);
-  // With diagnostics on the failure goes through the assertion handler, which logs and throws.
+namespace {
+
+Ref<NSString> reasonOf(const Ref<XQueryError>& error) {
+  return error ? error->description() : Ref<NSString>();
+}
+
+// With diagnostics on an error goes through the assertion handler, which logs it and throws under a
+// name of its own.
+void logAsAssertionFailure(const Ref<XQueryError>& error) {
+  const Ref<NSString> reason = reasonOf(error);
   NSLog(
       "*** Assertion failure in -[XQueryContextInternal setError:raiseException:], "
       "Eval/XQueryContextInternal:288: " +
       (reason ? reason->utf8() : std::string("(null)")));
-  throw NSException("NSInternalInconsistencyException", reason);
+}
+
+[[noreturn]] void throwError(const Ref<XQueryError>& error) {
+  throw NSException(XQueryLogEnabled() ? "NSInternalInconsistencyException" : "XQueryError",
+                    reasonOf(error));
+}
+
+}  // namespace
+
+void XQueryContextInternal::setError(Ref<XQueryError> error, bool raiseException) {
+  _error = std::move(error);
+  if (!raiseException) return;
+  if (XQueryLogEnabled()) logAsAssertionFailure(_error);
+  throwError(_error);
+}
+
+Value XQueryContextInternal::fail(Ref<XQueryError> error) {
+  _error = std::move(error);
+  if (XQueryLogEnabled()) logAsAssertionFailure(_error);
+  _failure = Failure::Error;
+  return {};
+}
+
+void XQueryContextInternal::passOverFailure(Ref<XQueryError> error) {
+  if (std::exchange(_failure, Failure::None) == Failure::WantOfMemory) throw std::bad_alloc();
+  _error = std::move(error);
+}
+
+void XQueryContextInternal::throwFailure() {
+  if (std::exchange(_failure, Failure::None) == Failure::WantOfMemory) throw std::bad_alloc();
+  throwError(_error);
 }
 
 void XQueryContextInternal::raise(Ref<XQueryError> error) {

@@ -113,6 +113,26 @@ class XQueryContextInternal {
   // For code that always raises.
   [[noreturn]] void raise(Ref<XQueryError> error);
 
+  // --- failing -----------------------------------------------------------------------------------
+  // An error is on its way out from the expression that met it, which answered null, until somebody
+  // passes over it or the evaluation has ended; nothing is evaluated meanwhile.
+  bool isFailing() const { return _failure != Failure::None; }
+  // For an expression, which answers what this answers: keeps the error like `raise` and throws
+  // nothing.
+  [[gnu::cold]] Value fail(Ref<XQueryError> error);
+  // The error that was kept last has been raised by an exception, which ends here.
+  void failAsRaised() { _failure = Failure::Error; }
+  // As yet without an error, for which there may be no memory before values are given back.
+  void failForWantOfMemory() { _failure = Failure::WantOfMemory; }
+  // Whether the evaluation ends, since a limit was reached, where other errors are passed over.
+  bool isFailingForGood() const {
+    return _failure == Failure::WantOfMemory || (isFailing() && XQueryIsLimit(_error.get()));
+  }
+  // Ends the failing; the error kept is the one given from now on. Want of memory is thrown on.
+  void passOverFailure(Ref<XQueryError> error);
+  // Goes on as an exception, for code that cannot answer null.
+  [[noreturn, gnu::cold]] void throwFailure();
+
   // The present of the first call, a dateTime; the same object at every later call.
   const Ref<XQueryDate>& currentDateTime();
 
@@ -131,6 +151,8 @@ class XQueryContextInternal {
   Value XQueryExternalFunctionForQName(const XQueryQName& qName) const;
 
  private:
+  enum class Failure : uint8_t { None, Error, WantOfMemory };
+
   XQueryFrameRef _variables;
   XQueryNamespaceStack _inScopeNamespaces;
   const uint64_t _baseURIOwner;  // this context's number among those that record base URIs
@@ -154,6 +176,12 @@ class XQueryContextInternal {
   int64_t _position = 0;
   int64_t _last = 0;
   bool _ordered = true;
+  Failure _failure = Failure::None;
 };
+
+// Whether the expression that answered this has met an error.
+inline bool XQueryHasFailed(const Value& answer, const XQueryContext& context) {
+  return !answer && context._internal().isFailing();
+}
 
 }  // namespace xquery

@@ -38,6 +38,7 @@ void evaluateVariable(const XQueryVarDecl& declaration, XQueryContext& publicCon
   const Value value = declaration.expr()->evaluateWithContext(publicContext);
   context.setActiveProlog(prolog);
   context.setOrdered(ordered);
+  if (XQueryHasFailed(value, publicContext)) context.throwFailure();
   if (!value) raiseUnresolved(unresolved, name, context);
   context.setGlobal(value, declaration.name());
 }

@@ -222,6 +222,7 @@ Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
     XQuerySetConstants(constants, *compiled.prolog(), *this);
     XQueryEvaluateDeclarations(*compiled.prolog(), *this);
     Value result = compiled.body() ? compiled.body()->evaluateWithContext(*this) : Value();
+    if (XQueryHasFailed(result, *this)) _private->throwFailure();
     // Nor is a result of more than it may take handed out because it was made in a few steps.
     watch.lookAtWork();
     return result;

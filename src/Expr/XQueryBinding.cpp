@@ -11,11 +11,7 @@ int64_t XQueryDeclareLocalVariable(const Ref<NSString>& name, XQueryProlog& prol
   return qName ? prolog.newLocalVariableIDForQName(qName) : 0;
 }
 
-Value XQueryEvaluateOrEmpty(const XQueryExpr* expr, XQueryContext& context) {
-  return expr ? expr->evaluateWithContext(context) : Value(NSNull::null());
-}
-
-Value XQueryBindingExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryBindingExpr::computeValue(XQueryContext& context) const {
   return XQueryEvaluateOrEmpty(_expr.get(), context);
 }
 

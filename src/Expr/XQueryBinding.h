@@ -4,6 +4,7 @@
 
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
+#include "xquery/Collection.h"
 #include "xquery/String.h"
 
 #include <utility>
@@ -15,7 +16,10 @@ namespace xquery {
 int64_t XQueryDeclareLocalVariable(const Ref<NSString>& name, XQueryProlog& prolog);
 
 // Evaluates an expression that may be absent; an absent one is the empty sequence.
-Value XQueryEvaluateOrEmpty(const XQueryExpr* expr, XQueryContext& context);
+[[gnu::always_inline]] inline Value XQueryEvaluateOrEmpty(const XQueryExpr* expr,
+                                                          XQueryContext& context) {
+  return expr ? expr->evaluateWithContext(context) : Value(NSNull::null());
+}
 
 class XQueryBindingExpr : public XQueryExpr {
  public:
@@ -26,7 +30,7 @@ class XQueryBindingExpr : public XQueryExpr {
   int64_t varID() const { return _varID; }
 
   // The value that the variable takes, or what a case answers.
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   // `type` and `expr` may be null; `varName` may be null or empty.

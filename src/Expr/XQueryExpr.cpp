@@ -1,9 +1,32 @@
 #include "Expr/XQueryExpr.h"
 
+#include "Context/XQueryContextInternal.h"
+#include "Types/XQueryErrors.h"
+
+#include <new>
+#include <stdexcept>
+
 namespace xquery {
 
 Ref<NSString> XQueryExpr::description() const {
   return NSString::stringWithASCII("<XQueryExpr>");
+}
+
+void XQueryCatchRaised(XQueryContext& context) {
+  context._internal().failAsRaised();
+}
+
+void XQueryCatchFailure(XQueryContext& context) {
+  auto& dynamic = context._internal();
+  try {
+    throw;
+  } catch (const std::bad_alloc&) {
+    dynamic.failForWantOfMemory();
+  } catch (const std::length_error&) {
+    // Only decimals throw it.
+    dynamic.setError(XQueryErrors::tooManyDigits.error(), false);
+    dynamic.failAsRaised();
+  }
 }
 
 }  // namespace xquery

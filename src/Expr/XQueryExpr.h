@@ -3,12 +3,25 @@
 // A compiled query is a tree of expressions. Every node answers two messages: bindInfoForProlog,
 // run once after parsing to resolve names against the static context, and evaluateWithContext, run
 // per evaluation. Evaluation never changes an expression, so one tree serves several threads.
+//
+// An error leaves the recursion of evaluation as a value does, by returning: the expression that
+// meets it records it in the context and answers null, and so does every expression around it:
+//
+//   const Value left = _left->evaluateWithContext(context);
+//   if (XQueryHasFailed(left, context)) return {};
+//
+// What does not evaluate expressions (casts, built-in functions, collectors, looks at the limits)
+// raises an NSException instead. That gets as far as the expression that was being evaluated, which
+// evaluateWithContext answers null for: unwinding takes microseconds for each frame and a
+// recursion of a million frames would take seconds to end.
 #pragma once
 
+#include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
 #include <cstdint>
+#include <exception>
 
 namespace xquery {
 
@@ -25,8 +38,13 @@ class XQueryExpr : public NSCounted {
 
   // Problems are added to the prolog's errors, never thrown.
   virtual void bindInfoForProlog(XQueryProlog& prolog) = 0;
-  // A value in one of the four shapes; raises through the context.
-  virtual Value evaluateWithContext(XQueryContext& context) const = 0;
+  // A value in one of the four shapes. Null when an error is on its way out, which the context then
+  // says (XQueryHasFailed), and for what has no value, such as "." without a focus. Throws nothing
+  // but what a client of the host threw that is no NSException.
+  [[gnu::always_inline]] Value evaluateWithContext(XQueryContext& context) const;
+  // What evaluateWithContext answers: to be defined, and called by nobody else, since it lets
+  // exceptions out.
+  virtual Value computeValue(XQueryContext& context) const = 0;
   // For diagnostics.
   virtual Ref<NSString> description() const;
 
@@ -35,5 +53,21 @@ class XQueryExpr : public NSCounted {
 
   int64_t _line;
 };
+
+// Make an exception that an expression let out an error on its way out. The second one, to be
+// called by the handler, throws on what stands for no error of the query.
+[[gnu::cold]] void XQueryCatchRaised(XQueryContext& context);
+[[gnu::cold]] void XQueryCatchFailure(XQueryContext& context);
+
+inline Value XQueryExpr::evaluateWithContext(XQueryContext& context) const {
+  try {
+    return computeValue(context);
+  } catch (const NSException&) {
+    XQueryCatchRaised(context);
+  } catch (const std::exception&) {
+    XQueryCatchFailure(context);
+  }
+  return {};
+}
 
 }  // namespace xquery

@@ -57,7 +57,7 @@ void XQueryVariable::bindInfoForProlog(XQueryProlog& prolog) {
   if (_qName) _varID = prolog.localVariableIDForQName(_qName);
 }
 
-Value XQueryVariable::evaluateWithContext(XQueryContext& context) const {
+Value XQueryVariable::computeValue(XQueryContext& context) const {
   auto& dynamic = context._internal();
   NSObject* value = nullptr;
   if (_varID != 0) {
@@ -66,9 +66,7 @@ Value XQueryVariable::evaluateWithContext(XQueryContext& context) const {
   } else if (_qName) {
     value = dynamic.globalForQName(*_qName);
   }
-  if (!value) {
-    dynamic.raise(XQueryErrors::undefinedVariable.errorAtLine(exprLine(), _name));
-  }
+  if (!value) return dynamic.fail(XQueryErrors::undefinedVariable.errorAtLine(exprLine(), _name));
   return value;
 }
 
@@ -81,7 +79,7 @@ XQueryContextItem* XQueryContextItem::contextItem() {
   return shared;
 }
 
-Value XQueryContextItem::evaluateWithContext(XQueryContext& context) const {
+Value XQueryContextItem::computeValue(XQueryContext& context) const {
   return context._internal().contextItem();
 }
 
@@ -100,7 +98,11 @@ Ref<XQueryQNameReference> XQueryQNameReference::qNameReferenceWithQName(Ref<XQue
   return make<XQueryQNameReference>(Ref<NSString>(), std::move(qName), line);
 }
 
-Value XQueryQNameReference::evaluateWithContext(XQueryContext& context) const {
+Value XQueryQNameReference::computeValue(XQueryContext& context) const {
+  return qNameForContext(context);
+}
+
+Ref<XQueryQName> XQueryQNameReference::qNameForContext(XQueryContext& context) const {
   if (_qName) return _qName;
   auto& dynamic = context._internal();
   if (_localPart && _localPart->length() > 0) {

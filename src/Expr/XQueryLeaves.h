@@ -23,7 +23,7 @@ class XQueryLiteral : public XQueryExpr {
   const Value& literalValue() const { return _value; }
   void bindInfoForProlog(XQueryProlog&) override {}
   // The stored object itself, every time.
-  Value evaluateWithContext(XQueryContext&) const override { return _value; }
+  Value computeValue(XQueryContext&) const override { return _value; }
   Ref<NSString> description() const override;
 
  protected:
@@ -45,7 +45,7 @@ class XQueryVariable : public XQueryExpr {
   // 0 for a variable that is not local.
   int64_t varID() const { return _varID; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   explicit XQueryVariable(Ref<NSString> name)
@@ -68,7 +68,7 @@ class XQueryContextItem : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog&) override {}
   // Null when there is no focus.
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  private:
   XQueryContextItem() : XQueryExpr(Kind::ContextItemExpr) {}
@@ -86,7 +86,9 @@ class XQueryQNameReference : public XQueryExpr {
                                                                          int64_t line);
 
   void bindInfoForProlog(XQueryProlog&) override {}
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
+  // The same for those who raise errors. Raises error 1 for a name that has no namespace even now.
+  Ref<XQueryQName> qNameForContext(XQueryContext& context) const;
 
  protected:
   XQueryQNameReference(Ref<NSString> name, Ref<XQueryQName> qName, int64_t line);

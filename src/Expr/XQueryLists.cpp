@@ -1,6 +1,7 @@
 #include "Expr/XQueryLists.h"
 
 #include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQuerySequence.h"
 #include "xquery/Collection.h"
@@ -29,20 +30,24 @@ void XQueryExprList::bindInfoForProlog(XQueryProlog& prolog) {
   for (size_t index = 0; index < count(); ++index) objectAtIndex(index)->bindInfoForProlog(prolog);
 }
 
-Value XQueryExprList::evaluateWithContext(XQueryContext& context) const {
+Value XQueryExprList::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   XQueryGatherer results;
   for (size_t index = 0; index < count(); ++index) {
-    results.add(objectAtIndex(index)->evaluateWithContext(context));
+    Value value = objectAtIndex(index)->evaluateWithContext(context);
+    if (XQueryHasFailed(value, context)) return {};
+    results.add(std::move(value));
   }
   return results.value();
 }
 
-Value XQueryArgs::evaluateWithContext(XQueryContext& context) const {
+Value XQueryArgs::computeValue(XQueryContext& context) const {
   auto arguments = NSArray::array();
   arguments->objects().reserve(count());
   for (size_t index = 0; index < count(); ++index) {
-    arguments->objects().push_back(objectAtIndex(index)->evaluateWithContext(context));
+    Value value = objectAtIndex(index)->evaluateWithContext(context);
+    if (XQueryHasFailed(value, context)) return {};
+    arguments->objects().push_back(std::move(value));
   }
   return arguments;
 }

@@ -27,7 +27,7 @@ class XQueryExprList : public XQueryExpr {
   void replaceObjectAtIndex(size_t index, Ref<XQueryExpr> withObject);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   explicit XQueryExprList(Kind kind = Kind::ExprList) : XQueryExpr(kind) {}
@@ -43,7 +43,7 @@ class XQueryArgs : public XQueryExprList {
   static bool classof(const NSObject& object) { return object.kind() == Kind::Args; }
 
   [[nodiscard]] static Ref<XQueryArgs> args() { return make<XQueryArgs>(); }
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryArgs() : XQueryExprList(Kind::Args) {}

@@ -13,7 +13,6 @@ namespace xquery {
 namespace {
 
 // Puts the caller's local variables aside for a frame of the callee's, and back on every way out.
-// An exception that passes needs no catching for that: unwinding a deep recursion stays linear.
 class CalleeFrame {
  public:
   CalleeFrame(XQueryContextInternal& context, XQueryFrameRef frame)
@@ -75,42 +74,44 @@ void XQueryFunctionCall::bindInfoForProlog(XQueryProlog& prolog) {
   if (_args) _args->bindInfoForProlog(prolog);
 }
 
-Value XQueryFunctionCall::evaluateWithContext(XQueryContext& context) const {
+Value XQueryFunctionCall::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   if (_functionDecl) return callDeclared(context);
   if (_function) return callBuiltIn(context);
-  evaluateArguments(context);
-  raiseUndefined(context);
+  return evaluateArguments(context) ? failUndefined(context) : Value();
 }
 
-// For calls that fail whatever the arguments are, once these have been evaluated.
-void XQueryFunctionCall::evaluateArguments(XQueryContext& context) const {
-  for (size_t index = 0; index < argumentCount(); ++index) argument(index, context);
+// For calls that fail whatever the arguments are, once these have been evaluated. False for an
+// error among them.
+bool XQueryFunctionCall::evaluateArguments(XQueryContext& context) const {
+  for (size_t index = 0; index < argumentCount(); ++index) {
+    if (XQueryHasFailed(argument(index, context), context)) return false;
+  }
+  return true;
 }
 
 Value XQueryFunctionCall::callDeclared(XQueryContext& context) const {
   auto& dynamic = context._internal();
   const auto& params = _functionDecl->params();
   if (params.size() != argumentCount()) {
-    evaluateArguments(context);
-    raiseInvalidArguments(context);
+    return evaluateArguments(context) ? failInvalidArguments(context) : Value();
   }
   // An external function was never bound to anything.
   if (_functionDecl->isExternal()) {
-    evaluateArguments(context);
-    raiseUndefined(context);
+    return evaluateArguments(context) ? failUndefined(context) : Value();
   }
   // The arguments go straight into the callee's frame, which is not in force yet.
   XQueryFrameRef frame = params.empty() ? XQueryFrameRef() : make<XQueryFrame>();
   for (size_t index = 0; index < params.size(); ++index) {
     Value value = argument(index, context);
+    if (XQueryHasFailed(value, context)) return {};
     if (const int64_t varID = params[index]->varID()) frame->setValue(std::move(value), varID);
   }
   const CalleeFrame calleeFrame(dynamic, std::move(frame));
   const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
   Value result = _functionDecl->expr()->evaluateWithContext(context);
-  if (!result) raiseUndefined(context);
-  if (auto* error = dyn_cast<XQueryError>(result)) dynamic.raise(error);
+  if (!result) return dynamic.isFailing() ? Value() : failUndefined(context);
+  if (auto* error = dyn_cast<XQueryError>(result)) return dynamic.fail(error);
   return result;
 }
 
@@ -126,27 +127,29 @@ Value XQueryFunctionCall::callBuiltIn(XQueryContext& context) const {
 
 Value XQueryFunctionCall::callBuiltIn(Value* arguments, size_t count,
                                       XQueryContext& context) const {
+  auto& dynamic = context._internal();
   bool isComplete = true;
   for (size_t index = 0; index < count; ++index) {
     arguments[index] = normalised(argument(index, context));
-    isComplete = isComplete && arguments[index];
+    if (arguments[index]) continue;
+    if (dynamic.isFailing()) return {};
+    isComplete = false;
   }
   // An argument without a value, as "." is without a focus, is none that a function could use.
-  if (!isComplete) raiseInvalidArguments(context);
-  auto& dynamic = context._internal();
+  if (!isComplete) return failInvalidArguments(context);
   const CalleeFrame calleeFrame(dynamic, nullptr);
   Value result = normalised(_function(arguments, count, context));
-  if (!result) raiseInvalidArguments(context);
-  if (auto* error = dyn_cast<XQueryError>(result)) dynamic.raise(error);
+  if (!result) return failInvalidArguments(context);
+  if (auto* error = dyn_cast<XQueryError>(result)) return dynamic.fail(error);
   return result;
 }
 
-void XQueryFunctionCall::raiseUndefined(XQueryContext& context) const {
-  context._internal().raise(XQueryErrors::undefinedFunction.errorAtLine(exprLine(), _name));
+Value XQueryFunctionCall::failUndefined(XQueryContext& context) const {
+  return context._internal().fail(XQueryErrors::undefinedFunction.errorAtLine(exprLine(), _name));
 }
 
-void XQueryFunctionCall::raiseInvalidArguments(XQueryContext& context) const {
-  context._internal().raise(XQueryErrors::invalidArguments.errorAtLine(exprLine(), _name));
+Value XQueryFunctionCall::failInvalidArguments(XQueryContext& context) const {
+  return context._internal().fail(XQueryErrors::invalidArguments.errorAtLine(exprLine(), _name));
 }
 
 }  // namespace xquery

@@ -30,8 +30,8 @@ class XQueryFunctionCall : public XQueryCallExpr {
   // Argument values are handed over as they are: declared types are not applied.
   //   error 8   function ... not defined for context   nothing was found, or it gave no value
   //   error 17  invalid arguments to function - ...    the built-in function refused its arguments
-  // An error that the function answers is raised.
-  Value evaluateWithContext(XQueryContext& context) const override;
+  // An error that the function answers is one of the call.
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryFunctionCall(Ref<NSString> name, Ref<XQueryArgs> args)
@@ -44,13 +44,13 @@ class XQueryFunctionCall : public XQueryCallExpr {
   Value argument(size_t index, XQueryContext& context) const {
     return _args->objectAtIndex(index)->evaluateWithContext(context);
   }
-  void evaluateArguments(XQueryContext& context) const;
+  bool evaluateArguments(XQueryContext& context) const;
   Value callDeclared(XQueryContext& context) const;
   Value callBuiltIn(XQueryContext& context) const;
   Value callBuiltIn(Value* arguments, size_t count, XQueryContext& context) const;
   // Out of line: what they need of the stack is no part of a recursion's frames.
-  [[noreturn, gnu::noinline]] void raiseUndefined(XQueryContext& context) const;
-  [[noreturn, gnu::noinline]] void raiseInvalidArguments(XQueryContext& context) const;
+  [[gnu::noinline, gnu::cold]] Value failUndefined(XQueryContext& context) const;
+  [[gnu::noinline, gnu::cold]] Value failInvalidArguments(XQueryContext& context) const;
 
   Ref<NSString> _name;
   XQueryProcedure _function = nullptr;

@@ -38,7 +38,7 @@ void XQueryParam::bindInfoForProlog(XQueryProlog& prolog) {
   if (_type) _type->bindInfoForProlog(prolog);
 }
 
-Value XQueryParam::evaluateWithContext(XQueryContext&) const {
+Value XQueryParam::computeValue(XQueryContext&) const {
   return NSNull::null();
 }
 

@@ -61,7 +61,7 @@ class XQueryParam : public XQueryExpr {
   // A name that the function's parameter list already used is error 39.
   void bindInfoForProlog(XQueryProlog& prolog) override;
   // NSNull: a parameter is not evaluated for a value.
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryParam(Ref<NSString> name, Ref<XQueryTypeDeclaration> type);

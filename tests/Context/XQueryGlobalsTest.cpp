@@ -17,9 +17,7 @@ class Initializer : public XQueryExpr {
   using Work = std::function<Value(XQueryContextInternal&)>;
   explicit Initializer(Work work) : XQueryExpr(Kind::OtherExpr), _work(std::move(work)) {}
   void bindInfoForProlog(XQueryProlog&) override {}
-  Value evaluateWithContext(XQueryContext& context) const override {
-    return _work(context._internal());
-  }
+  Value computeValue(XQueryContext& context) const override { return _work(context._internal()); }
 
  private:
   Work _work;

@@ -29,9 +29,7 @@ class Body : public XQueryExpr {
   explicit Body(std::function<Value(XQueryContextInternal&)> work)
       : XQueryExpr(Kind::OtherExpr), _work(std::move(work)) {}
   void bindInfoForProlog(XQueryProlog&) override {}
-  Value evaluateWithContext(XQueryContext& context) const override {
-    return _work(context._internal());
-  }
+  Value computeValue(XQueryContext& context) const override { return _work(context._internal()); }
 
  private:
   std::function<Value(XQueryContextInternal&)> _work;

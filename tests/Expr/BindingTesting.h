@@ -131,7 +131,7 @@ class BindingTesting : public testing::Test {
   // What evaluation answers, or "error 6 message" with " line 3" from the second line on.
   std::string evaluated(const XQueryExpr& expr) {
     try {
-      return show(expr.evaluateWithContext(*context));
+      return show(evaluatedOrThrown(expr, *context));
     } catch (const NSException& exception) {
       EXPECT_EQ(exception.name(), "XQueryError");
       const auto& raised = dynamic().error();

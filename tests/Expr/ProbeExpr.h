@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Context/XQueryContextInternal.h"
+#include "Expr/Evaluated.h"
 #include "Expr/XQueryExpr.h"
 #include "xquery/Error.h"
 
@@ -20,7 +21,7 @@ class ProbeExpr : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog& prolog) override {
     if (_bind) _bind(prolog);
   }
-  Value evaluateWithContext(XQueryContext& context) const override { return _evaluate(context); }
+  Value computeValue(XQueryContext& context) const override { return _evaluate(context); }
 
  private:
   Evaluate _evaluate;

@@ -1,4 +1,5 @@
 #include "Context/XQueryContextInternal.h"
+#include "Expr/Evaluated.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Expr/XQuerySequence.h"
@@ -37,7 +38,7 @@ class BindNote : public XQueryExpr {
   explicit BindNote(std::function<void()> onBind)
       : XQueryExpr(Kind::OtherExpr), _onBind(std::move(onBind)) {}
   void bindInfoForProlog(XQueryProlog&) override { _onBind(); }
-  Value evaluateWithContext(XQueryContext&) const override { return NSNull::null(); }
+  Value computeValue(XQueryContext&) const override { return NSNull::null(); }
 
  private:
   std::function<void()> _onBind;
@@ -45,7 +46,7 @@ class BindNote : public XQueryExpr {
 
 class Leaves : public testing::Test {
  protected:
-  Value evaluate(const XQueryExpr& expr) { return expr.evaluateWithContext(*context); }
+  Value evaluate(const XQueryExpr& expr) { return evaluatedOrThrown(expr, *context); }
   XQueryContextInternal& dynamic() { return context->_internal(); }
   // The error that evaluating raises.
   Ref<XQueryError> failure(const XQueryExpr& expr) {

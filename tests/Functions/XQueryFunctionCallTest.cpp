@@ -1,4 +1,5 @@
 #include "Context/XQueryContextInternal.h"
+#include "Expr/Evaluated.h"
 #include "Expr/XQueryLeaves.h"
 #include "Functions/Boolean.h"
 #include "Functions/FunctionsTesting.h"
@@ -22,7 +23,7 @@ class ActingExpr : public XQueryExpr {
   using Act = std::function<Value(XQueryContext&)>;
   explicit ActingExpr(Act act) : XQueryExpr(Kind::OtherExpr), _act(std::move(act)) {}
   void bindInfoForProlog(XQueryProlog&) override { ++boundTimes; }
-  Value evaluateWithContext(XQueryContext& context) const override { return _act(context); }
+  Value computeValue(XQueryContext& context) const override { return _act(context); }
   int boundTimes = 0;
 
  private:
@@ -58,7 +59,7 @@ class FunctionCall : public testing::Test {
   // "error 8 line 3 message", or the value.
   std::string evaluated(const XQueryExpr& expr) {
     try {
-      return functiontest::show(expr.evaluateWithContext(*context));
+      return functiontest::show(evaluatedOrThrown(expr, *context));
     } catch (const NSException&) {
       const auto& error = dynamic.error();
       return "error " + std::to_string(error->err()) + " line " + std::to_string(error->line()) +

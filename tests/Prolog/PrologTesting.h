@@ -29,7 +29,7 @@ class ProbeExpr : public XQueryExpr {
   explicit ProbeExpr(std::function<void(XQueryProlog&)> onBind)
       : XQueryExpr(Kind::OtherExpr), _onBind(std::move(onBind)) {}
   void bindInfoForProlog(XQueryProlog& prolog) override { _onBind(prolog); }
-  Value evaluateWithContext(XQueryContext&) const override { return NSNull::null(); }
+  Value computeValue(XQueryContext&) const override { return NSNull::null(); }
 
  private:
   std::function<void(XQueryProlog&)> _onBind;

@@ -1,5 +1,6 @@
 #include "Expr/Clauses/XQueryClauseItems.h"
 
+#include "Context/XQueryContextInternal.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Operators/XQueryRange.h"
 #include "Expr/XQueryBinding.h"
@@ -11,13 +12,17 @@ XQueryClauseItems::XQueryClauseItems(const XQueryExpr* expr, bool flattens, XQue
     : _list(nullptr) {
   if (const XQueryOperatorExpr* range = XQueryOperatorExpr::rangeIn(expr)) {
     const XQueryRangeBounds bounds = range->rangeBounds(context);
-    if (!bounds.areIntegers) return;
+    if (!bounds.areIntegers) {
+      _haveFailed = XQueryHasFailed(bounds.answer, context);
+      return;
+    }
     _count = XQueryRangeCount(bounds, context);
     _first = bounds.first;
     _isRange = true;
     return;
   }
   _value = XQueryEvaluateOrEmpty(expr, context);
+  _haveFailed = XQueryHasFailed(_value, context);
   if (flattens) _value = flattened(std::move(_value));
   _list = XQueryItemList(_value.get());
   _count = _list.count();

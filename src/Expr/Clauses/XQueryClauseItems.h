@@ -21,6 +21,8 @@ class XQueryClauseItems {
   // walked and NSNull in it is no item; otherwise the elements of an array are the items.
   XQueryClauseItems(const XQueryExpr* expr, bool flattens, XQueryContext& context);
 
+  // An error has come up instead of the items.
+  bool haveFailed() const { return _haveFailed; }
   size_t count() const { return _count; }
   Value operator[](size_t index) const;
 
@@ -28,6 +30,7 @@ class XQueryClauseItems {
   Value _value;          // of anything but a range
   XQueryItemList _list;  // over the value
   bool _isRange = false;
+  bool _haveFailed = false;
   int64_t _first = 0;
   size_t _count = 0;
 };

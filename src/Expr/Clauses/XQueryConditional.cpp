@@ -21,21 +21,33 @@ void XQueryConditionalExpr::bindInfoForProlog(XQueryProlog& prolog) {
   }
 }
 
-Value XQueryConditionalExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryConditionalExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
-  const Value test =
-      XQueryEffectiveBooleanValue(XQueryEvaluateOrEmpty(_test.get(), context), context);
   const XQueryExpr* branch = nullptr;
-  if (test == NSNumber::trueValue()) {
+  if (!chooseBranch(branch, context)) return {};
+  Value value = XQueryEvaluateOrEmpty(branch, context);
+  if (!value && !context._internal().isFailing()) failConversion(context);
+  return value;
+}
+
+// False for a test that has failed. What it needs of the stack is no part of a recursion's frames.
+bool XQueryConditionalExpr::chooseBranch(const XQueryExpr*& branch, XQueryContext& context) const {
+  const Value test = XQueryEvaluateOrEmpty(_test.get(), context);
+  if (XQueryHasFailed(test, context)) return false;
+  const Value truth = XQueryEffectiveBooleanValue(test, context);
+  if (truth == NSNumber::trueValue()) {
     branch = _then.get();
-  } else if (test == NSNumber::falseValue()) {
+  } else if (truth == NSNumber::falseValue()) {
     branch = _else.get();
   } else {
-    context._internal().raise(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
+    failConversion(context);
+    return false;
   }
-  Value value = XQueryEvaluateOrEmpty(branch, context);
-  if (!value) context._internal().raise(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
-  return value;
+  return true;
+}
+
+void XQueryConditionalExpr::failConversion(XQueryContext& context) const {
+  context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
 }
 
 }  // namespace xquery

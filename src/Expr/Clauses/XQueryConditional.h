@@ -16,7 +16,7 @@ class XQueryConditionalExpr : public XQueryExpr {
                                                                 Ref<XQueryExpr> elseExpr);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryConditionalExpr(Ref<XQueryExpr> intWithTestExpr, Ref<XQueryExpr> thenExpr,
@@ -29,6 +29,9 @@ class XQueryConditionalExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  [[gnu::noinline]] bool chooseBranch(const XQueryExpr*& branch, XQueryContext& context) const;
+  [[gnu::noinline, gnu::cold]] void failConversion(XQueryContext& context) const;
+
   Ref<XQueryExpr> _test;
   Ref<XQueryExpr> _then;
   Ref<XQueryExpr> _else;

@@ -75,7 +75,7 @@ void XQueryOrderSpec::bindInfoForProlog(XQueryProlog& prolog) {
   if (_expr) _expr->bindInfoForProlog(prolog);
 }
 
-Value XQueryOrderSpec::evaluateWithContext(XQueryContext& context) const {
+Value XQueryOrderSpec::computeValue(XQueryContext& context) const {
   return XQueryEvaluateOrEmpty(_expr.get(), context);
 }
 
@@ -109,45 +109,47 @@ void XQueryFLWORExpr::bindInfoForProlog(XQueryProlog& prolog) {
   _join = last ? XQueryForJoin::joinOf(*last, _whereExpr.get()) : nullptr;
 }
 
-void XQueryFLWORExpr::checkType(const XQueryBindingExpr& clause, const NSObject* value,
-                                XQueryContext& context) const {
-  if (clause.type() && !XQueryInstanceOf(value, *clause.type(), &context)) {
-    context._internal().raise(XQueryErrors::invalidType.errorAtLine(clause.exprLine()));
-  }
+bool XQueryFLWORExpr::isOfType(const XQueryBindingExpr& clause, const NSObject* value,
+                               XQueryContext& context) const {
+  if (!clause.type() || XQueryInstanceOf(value, *clause.type(), &context)) return true;
+  context._internal().fail(XQueryErrors::invalidType.errorAtLine(clause.exprLine()));
+  return false;
 }
 
-void XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toResults,
+bool XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toResults,
                                          XQueryContext& withContext) const {
   XQueryCheckStack(withContext);
   for (; clause < _forLet.size(); ++clause) {
     const XQueryBindingExpr& binding = *_forLet[clause];
     if (const auto* forExpr = dyn_cast<XQueryForExpr>(&binding)) {
-      evaluateFor(*forExpr, clause, toResults, withContext);
-      return;
+      return evaluateFor(*forExpr, clause, toResults, withContext);
     }
-    const Value value = binding.evaluateWithContext(withContext);
-    checkType(binding, value.get(), withContext);
-    withContext._internal().setVariable(value, binding.varID());
+    Value value = binding.evaluateWithContext(withContext);
+    if (XQueryHasFailed(value, withContext)) return false;
+    if (!isOfType(binding, value.get(), withContext)) return false;
+    withContext._internal().setVariable(std::move(value), binding.varID());
   }
-  if (!_forLet.empty()) processItem(toResults, withContext);
+  return _forLet.empty() || processItem(toResults, withContext);
 }
 
-void XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
+bool XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
                                   XQueryFLWORResults& toResults, XQueryContext& withContext) const {
   const bool isLast = index + 1 == _forLet.size();
-  if (isLast && _join && evaluateJoin(clause, toResults, withContext)) return;
+  if (isLast && _join && evaluateJoin(clause, toResults, withContext)) {
+    return !withContext._internal().isFailing();
+  }
   const XQueryClauseItems items(clause.expr(), true, withContext);
+  if (items.haveFailed()) return false;
   for (size_t k = 0; k < items.count(); ++k) {
     checkWork();
     Value item = items[k];
-    checkType(clause, item.get(), withContext);
+    if (!isOfType(clause, item.get(), withContext)) return false;
     setTuple(clause, std::move(item), k, withContext);
-    if (isLast) {
-      processItem(toResults, withContext);
-    } else {
-      evaluateStartingAt(index + 1, toResults, withContext);
-    }
+    const bool goesOn = isLast ? processItem(toResults, withContext)
+                               : evaluateStartingAt(index + 1, toResults, withContext);
+    if (!goesOn) return false;
   }
+  return true;
 }
 
 // `position` counts from 0.
@@ -160,7 +162,8 @@ void XQueryFLWORExpr::setTuple(const XQueryForExpr& clause, Value item, size_t p
                       clause.posVarID());
 }
 
-// The tuples that the table of the join leaves over; false when it has nothing to say.
+// The tuples that the table of the join leaves over, up to an error; false when it has nothing to
+// say.
 bool XQueryFLWORExpr::evaluateJoin(const XQueryForExpr& clause, XQueryFLWORResults& toResults,
                                    XQueryContext& withContext) const {
   XQueryJoinTable::Selection selection;
@@ -170,42 +173,43 @@ bool XQueryFLWORExpr::evaluateJoin(const XQueryForExpr& clause, XQueryFLWORResul
   for (const auto& match : selection) {
     checkWork();
     setTuple(clause, items[match.position], match.position, withContext);
-    if (_join->decides(match)) {
-      addTuple(toResults, withContext);
-    } else {
-      processItem(toResults, withContext);
-    }
+    const bool goesOn = _join->decides(match) ? addTuple(toResults, withContext)
+                                              : processItem(toResults, withContext);
+    if (!goesOn) return true;
   }
   // Where the ID is used again by a variable that is never set, the last item can be read.
   setTuple(clause, items.back(), items.size() - 1, withContext);
   return true;
 }
 
-void XQueryFLWORExpr::processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const {
+bool XQueryFLWORExpr::processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const {
   if (_whereExpr) {
     const Value where = _whereExpr->evaluateWithContext(withContext);
+    if (XQueryHasFailed(where, withContext)) return false;
     // Only false drops the tuple: an error record lets it through.
-    if (XQueryEffectiveBooleanValue(where, withContext) == NSNumber::falseValue()) return;
+    if (XQueryEffectiveBooleanValue(where, withContext) == NSNumber::falseValue()) return true;
   }
-  addTuple(toResults, withContext);
+  return addTuple(toResults, withContext);
 }
 
-void XQueryFLWORExpr::addTuple(XQueryFLWORResults& toResults, XQueryContext& withContext) const {
+bool XQueryFLWORExpr::addTuple(XQueryFLWORResults& toResults, XQueryContext& withContext) const {
   Value value = XQueryEvaluateOrEmpty(_returnExpr.get(), withContext);
-  if (_orderSpecs.empty()) {
-    toResults.values.add(std::move(value));
-  } else {
-    addSortItems(std::move(value), toResults.sortList, withContext);
+  if (XQueryHasFailed(value, withContext)) return false;
+  if (!_orderSpecs.empty()) {
+    return addSortItems(std::move(value), toResults.sortList, withContext);
   }
+  toResults.values.add(std::move(value));
+  return true;
 }
 
 // Adds every item of the value with the keys of the tuple.
-void XQueryFLWORExpr::addSortItems(Value value, XQuerySortList& toList,
+bool XQueryFLWORExpr::addSortItems(Value value, XQuerySortList& toList,
                                    XQueryContext& context) const {
   const size_t sortInfo = toList.keys.size();
   for (const auto& spec : _orderSpecs) {
-    Value key = XQueryAtomizationCheckingOccurrence(spec->evaluateWithContext(context),
-                                                    XQueryOccurrenceAnyAlso, context);
+    const Value keyValue = spec->evaluateWithContext(context);
+    if (XQueryHasFailed(keyValue, context)) return false;
+    Value key = XQueryAtomizationCheckingOccurrence(keyValue, XQueryOccurrenceAnyAlso, context);
     if (XQueryObjectTypeID(key.get()) == XQueryTypeUntypedAtomic) {
       key = XQueryCastAsTypeForContext(key, XQueryTypeString, context);
     }
@@ -219,17 +223,18 @@ void XQueryFLWORExpr::addSortItems(Value value, XQuerySortList& toList,
     pacer.turn();
     toList.items.push_back({items[i], sortInfo, i});
   }
+  return true;
 }
 
-Value XQueryFLWORExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryFLWORExpr::computeValue(XQueryContext& context) const {
   XQueryFLWORResults results;
   results.sortList.keyCount = _orderSpecs.size();
-  evaluateStartingAt(0, results, context);
+  if (!evaluateStartingAt(0, results, context)) return {};
   if (_orderSpecs.empty()) return results.values.value();
 
   const XQueryOrderSpec& first = *_orderSpecs.front();
   if (!XQueryFLWORSort(results.sortList, first.ascending(), first.emptyLeast())) {
-    context._internal().raise(XQueryErrors::invalidType.errorAtLine(exprLine()));
+    return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
   }
   auto sorted = XQuerySequence::sequence();
   sorted->objects().reserve(results.sortList.items.size());
@@ -251,19 +256,14 @@ void XQueryOrderExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (_expr && XQueryCheckStack(prolog)) _expr->bindInfoForProlog(prolog);
 }
 
-Value XQueryOrderExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryOrderExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   auto& dynamic = context._internal();
   const bool saved = dynamic.ordered();
   dynamic.setOrdered(_ordered);
-  try {
-    Value value = XQueryEvaluateOrEmpty(_expr.get(), context);
-    dynamic.setOrdered(saved);
-    return value;
-  } catch (...) {
-    dynamic.setOrdered(saved);
-    throw;
-  }
+  Value value = XQueryEvaluateOrEmpty(_expr.get(), context);
+  dynamic.setOrdered(saved);
+  return value;
 }
 
 }  // namespace xquery

@@ -70,7 +70,7 @@ class XQueryOrderSpec : public XQueryExpr {
   bool emptyLeast() const { return _emptyOrder != EmptyGreatest; }
   const Ref<NSString>& collation() const { return _collation; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryOrderSpec(Ref<XQueryExpr> expr, bool ascending, EmptyOrder emptyOrder,
@@ -100,7 +100,7 @@ class XQueryFLWORExpr : public XQueryExpr {
 
   const OrderSpecs& orderSpecs() const { return _orderSpecs; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryFLWORExpr(Clauses forLet, Ref<XQueryExpr> whereExpr, OrderSpecs orderSpecs,
@@ -109,19 +109,21 @@ class XQueryFLWORExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  void evaluateStartingAt(size_t clause, XQueryFLWORResults& toResults,
+  // These answer false when an error has come up.
+  bool evaluateStartingAt(size_t clause, XQueryFLWORResults& toResults,
                           XQueryContext& withContext) const;
-  void evaluateFor(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
+  bool evaluateFor(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
                    XQueryContext& withContext) const;
-  static void setTuple(const XQueryForExpr& clause, Value item, size_t position,
-                       XQueryContext& context);
+  bool processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
+  bool addTuple(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
+  bool addSortItems(Value value, XQuerySortList& toList, XQueryContext& context) const;
+  bool isOfType(const XQueryBindingExpr& clause, const NSObject* value,
+                XQueryContext& context) const;
+
   bool evaluateJoin(const XQueryForExpr& clause, XQueryFLWORResults& toResults,
                     XQueryContext& withContext) const;
-  void processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
-  void addTuple(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
-  void checkType(const XQueryBindingExpr& clause, const NSObject* value,
-                 XQueryContext& context) const;
-  void addSortItems(Value value, XQuerySortList& toList, XQueryContext& context) const;
+  static void setTuple(const XQueryForExpr& clause, Value item, size_t position,
+                       XQueryContext& context);
 
   Clauses _forLet;
   Ref<XQueryExpr> _whereExpr;
@@ -137,7 +139,7 @@ class XQueryOrderExpr : public XQueryExpr {
   [[nodiscard]] static Ref<XQueryOrderExpr> orderExpr(Ref<XQueryExpr> expr, bool ordered);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryOrderExpr(Ref<XQueryExpr> expr, bool ordered)

@@ -30,14 +30,12 @@ Value valueOrNull(const XQueryExpr& expr, XQueryContext& context) {
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
   const Ref<XQueryError> error = dynamic.error();
-  try {
-    return expr.evaluateWithContext(context);
-  } catch (const NSException&) {
-    dynamic.setError(error, false);
-    dynamic.setContextItem(item, position);
-    dynamic.setLast(last);
-    return {};
-  }
+  Value value = expr.evaluateWithContext(context);
+  if (!XQueryHasFailed(value, context)) return value;
+  dynamic.passOverFailure(error);
+  dynamic.setContextItem(item, position);
+  dynamic.setLast(last);
+  return {};
 }
 
 // Where it has to be known for every round.

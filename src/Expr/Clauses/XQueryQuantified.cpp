@@ -40,22 +40,24 @@ void XQueryQuantifiedExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (_satisfies) _satisfies->bindInfoForProlog(prolog);
 }
 
-Value XQueryQuantifiedExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryQuantifiedExpr::computeValue(XQueryContext& context) const {
   Value answer = evaluatePostion(0, context);
-  if (!answer) context._internal().raise(XQueryErrors::invalidType.errorAtLine(exprLine()));
-  return answer;
+  if (answer || context._internal().isFailing()) return answer;
+  return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
 }
 
 Value XQueryQuantifiedExpr::evaluatePostion(size_t index, XQueryContext& withContext) const {
   XQueryCheckStack(withContext);
   if (index == _items.size()) {
-    return XQueryEffectiveBooleanValue(XQueryEvaluateOrEmpty(_satisfies.get(), withContext),
-                                       withContext);
+    const Value value = XQueryEvaluateOrEmpty(_satisfies.get(), withContext);
+    if (XQueryHasFailed(value, withContext)) return {};
+    return XQueryEffectiveBooleanValue(value, withContext);
   }
   // A clause without items does not decide: the next one is tried in its place, and goes on with
   // the clause after this one.
   for (size_t clause = index; clause < _items.size(); ++clause) {
-    if (Value answer = evaluateItems(clause, index, withContext)) return answer;
+    Value answer = evaluateItems(clause, index, withContext);
+    if (answer || withContext._internal().isFailing()) return answer;
   }
   return NSNumber::numberWithBool(_every);
 }
@@ -65,6 +67,7 @@ Value XQueryQuantifiedExpr::evaluateItems(size_t clause, size_t index,
                                           XQueryContext& context) const {
   const XQueryQuantifiedExprItem& binding = *_items[clause];
   const XQueryClauseItems items(binding.expr(), false, context);
+  if (items.haveFailed()) return {};
   const NSNumber* undecided = _every ? NSNumber::trueValue() : NSNumber::falseValue();
   Value answer;
   for (size_t i = 0; i < items.count(); ++i) {

@@ -31,7 +31,7 @@ class XQueryQuantifiedExpr : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   // One of the shared truth values, or the error record of a binding of the wrong type.
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryQuantifiedExpr(Items items, Ref<XQueryExpr> satisfies, bool every);

@@ -18,10 +18,11 @@ bool isDeclarationName(const NSXMLName& name) {
   return name.text == "xmlns" || NSXMLURIOf(*name.expanded) == reserved->view();
 }
 
+// Null when the name's expression has failed.
 NSXMLNameRef attributeName(const XQueryConstructorName& expr, XQueryContext& context,
                            int64_t line) {
   NSXMLNameRef name = expr.evaluate(context, line);
-  if (isDeclarationName(*name.get())) {
+  if (name && isDeclarationName(*name.get())) {
     context._internal().raise(XQueryErrors::attributeIsXMLNS.errorAtLine(line));
   }
   return name;
@@ -43,23 +44,29 @@ void XQueryAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
   for (const auto& item : _items) item->bindInfoForProlog(prolog);
 }
 
-Value XQueryAttributeExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryAttributeExpr::computeValue(XQueryContext& context) const {
   NSXMLNameRef name = attributeName(_name, context, exprLine());
-  return attribute(std::move(name), valueText(context));
-}
-
-void XQueryAttributeExpr::addTo(XQueryElementContent& content, XQueryContext& context) const {
-  NSXMLNameRef name = attributeName(_name, context, exprLine());
-  content.addNewAttribute(std::move(name), valueText(context).view());
-}
-
-NSMutableString XQueryAttributeExpr::valueText(XQueryContext& context) const {
   NSMutableString text;
+  if (!name || !appendValueText(text, context)) return {};
+  return attribute(std::move(name), text);
+}
+
+bool XQueryAttributeExpr::addTo(XQueryElementContent& content, XQueryContext& context) const {
+  NSXMLNameRef name = attributeName(_name, context, exprLine());
+  NSMutableString text;
+  if (!name || !appendValueText(text, context)) return false;
+  content.addNewAttribute(std::move(name), text.view());
+  return true;
+}
+
+bool XQueryAttributeExpr::appendValueText(NSMutableString& text, XQueryContext& context) const {
   for (const auto& item : _items) {
-    XQueryAppendText(item->evaluateWithContext(context), text, context);
+    const Value value = item->evaluateWithContext(context);
+    if (XQueryHasFailed(value, context)) return false;
+    XQueryAppendText(value, text, context);
   }
   XQueryNormalizeAttributeString(text);
-  return text;
+  return true;
 }
 
 size_t XQueryAttributeExpr::expectedTextLength() const {
@@ -83,11 +90,16 @@ void XQueryComputedAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (_value) _value->bindInfoForProlog(prolog);
 }
 
-Value XQueryComputedAttributeExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryComputedAttributeExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   NSXMLNameRef name = attributeName(_name, context, exprLine());
+  if (!name) return {};
   NSMutableString text;
-  if (_value) XQueryAppendText(_value->evaluateWithContext(context), text, context);
+  if (_value) {
+    const Value value = _value->evaluateWithContext(context);
+    if (XQueryHasFailed(value, context)) return {};
+    XQueryAppendText(value, text, context);
+  }
   XQueryNormalizeAttributeString(text);
   return attribute(std::move(name), text);
 }

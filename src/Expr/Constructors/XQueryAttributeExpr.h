@@ -22,12 +22,12 @@ class XQueryAttributeExpr : public XQueryExpr {
       const Ref<NSString>& name, std::vector<Ref<XQueryExpr>> forItems, char16_t enclosedWith);
 
   char16_t quoteChar() const { return _quoteChar; }
-  // Evaluates straight into an element that has no content yet.
-  void addTo(XQueryElementContent& content, XQueryContext& context) const;
+  // Evaluates straight into an element that has no content yet. False for an error.
+  bool addTo(XQueryElementContent& content, XQueryContext& context) const;
   // A guess at the length of the value: the literal parts, and a few digits for the rest.
   size_t expectedTextLength() const;
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryAttributeExpr(const Ref<NSString>& name, std::vector<Ref<XQueryExpr>> items,
@@ -40,7 +40,7 @@ class XQueryAttributeExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  NSMutableString valueText(XQueryContext& context) const;
+  bool appendValueText(NSMutableString& text, XQueryContext& context) const;
 
   XQueryConstructorName _name;
   std::vector<Ref<XQueryExpr>> _items;
@@ -55,7 +55,7 @@ class XQueryComputedAttributeExpr : public XQueryExpr {
       Ref<XQueryExpr> name, Ref<XQueryExpr> value);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryComputedAttributeExpr(Ref<XQueryExpr> name, Ref<XQueryExpr> value)

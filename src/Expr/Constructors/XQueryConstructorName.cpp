@@ -92,6 +92,7 @@ bool XQueryConstructorName::isConstantIn(XQueryContext& context) const {
 NSXMLNameRef XQueryConstructorName::evaluate(XQueryContext& context, int64_t line) const {
   if (isConstantIn(context)) return _constant;
   const Value value = _nameExpr ? _nameExpr->evaluateWithContext(context) : Value();
+  if (XQueryHasFailed(value, context)) return {};
   if (!value) {
     context._internal().raise(XQueryErrors::unresolvedQName.errorAtLine(line, _name));
   }

@@ -25,8 +25,8 @@ class XQueryConstructorName {
   // context's namespaces elsewhere.
   void bind(XQueryProlog& prolog, Kind nodeKind, int64_t line);
 
-  // Raises error 1 for a name that has no namespace even now, error 6 for a value that is no name
-  // of a node.
+  // Null when the expression has failed. Raises error 1 for a name that has no namespace even now,
+  // error 6 for a value that is no name of a node.
   NSXMLNameRef evaluate(XQueryContext& context, int64_t line) const;
 
  private:

@@ -40,6 +40,14 @@ void collectNamespaces(const XQueryElementExpr::Exprs& exprs,
   }
 }
 
+// False for an error.
+bool addValue(const XQueryExpr& expr, XQueryElementContent& content, XQueryContext& context) {
+  const Value value = expr.evaluateWithContext(context);
+  if (XQueryHasFailed(value, context)) return false;
+  content.add(value);
+  return true;
+}
+
 size_t roomForText(size_t length) {
   return NSXMLTree::roomForNode + (length + 7) / 8 * 8;
 }
@@ -83,14 +91,15 @@ void XQueryElementExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!_namespaces.empty()) prolog.popInScopeNamespaces();
 }
 
-Value XQueryElementExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryElementExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   auto& dynamic = context._internal();
   XQueryInScopeNamespaces namespaces(dynamic);
   if (!_namespaces.empty()) namespaces.push(_namespaces);
+  NSXMLNameRef name = _name.evaluate(context, exprLine());
+  if (!name) return {};
   NSXMLRoom room;
-  const Ref<NSXMLElement> element =
-      NSXMLTree::makeLoneElement(_name.evaluate(context, exprLine()).detach(), _roomBytes, room);
+  const Ref<NSXMLElement> element = NSXMLTree::makeLoneElement(name.detach(), _roomBytes, room);
   XQueryElementContent content(*element, room, namespaces, context, exprLine());
   dynamic.setBaseURI(dynamic.baseURI(), element.get());
   for (const auto& declaration : _namespaces) {
@@ -99,13 +108,14 @@ Value XQueryElementExpr::evaluateWithContext(XQueryContext& context) const {
   namespaces.updateNamespacesForElement(*element, *element->nodeName());
 
   for (const auto& expr : _attributes) {
-    if (const auto* attribute = dyn_cast<XQueryAttributeExpr>(expr.get())) {
-      attribute->addTo(content, context);
-    } else {
-      content.add(expr->evaluateWithContext(context));
-    }
+    const auto* attribute = dyn_cast<XQueryAttributeExpr>(expr.get());
+    const bool goesOn =
+        attribute ? attribute->addTo(content, context) : addValue(*expr, content, context);
+    if (!goesOn) return {};
   }
-  for (const auto& item : _items) content.add(item->evaluateWithContext(context));
+  for (const auto& item : _items) {
+    if (!addValue(*item, content, context)) return {};
+  }
   content.finish();
   return element;
 }

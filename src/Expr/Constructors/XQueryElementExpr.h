@@ -23,7 +23,7 @@ class XQueryElementExpr : public XQueryExpr {
                                                                       Ref<XQueryExpr> value);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryElementExpr(XQueryConstructorName name, Exprs attributes, Exprs items)

@@ -18,10 +18,15 @@ void bindPart(const Ref<XQueryExpr>& part, XQueryProlog& prolog) {
   if (part && XQueryCheckStack(prolog)) part->bindInfoForProlog(prolog);
 }
 
-// Appends the text of the value of a part, which may be missing. Answer: whether it had any item.
-bool appendTextOf(const Ref<XQueryExpr>& part, NSMutableString& text, XQueryContext& context) {
+enum class Part : uint8_t { Empty, Appended, Failed };
+
+// Appends the text of the value of a part, which may be missing.
+Part appendTextOf(const Ref<XQueryExpr>& part, NSMutableString& text, XQueryContext& context) {
   XQueryCheckStack(context);
-  return part && XQueryAppendText(part->evaluateWithContext(context), text, context);
+  if (!part) return Part::Empty;
+  const Value value = part->evaluateWithContext(context);
+  if (XQueryHasFailed(value, context)) return Part::Failed;
+  return XQueryAppendText(value, text, context) ? Part::Appended : Part::Empty;
 }
 
 }  // namespace
@@ -36,9 +41,16 @@ Ref<XQueryTextExpr> XQueryTextExpr::textExprWithValue(Ref<XQueryExpr> value) {
   return make<XQueryTextExpr>(std::move(value));
 }
 
-Value XQueryTextExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryTextExpr::computeValue(XQueryContext& context) const {
   NSMutableString text;
-  if (!appendTextOf(_value, text, context)) return NSNull::null();
+  switch (appendTextOf(_value, text, context)) {
+    case Part::Empty:
+      return NSNull::null();
+    case Part::Failed:
+      return {};
+    case Part::Appended:
+      break;
+  }
   return NSXMLNode::textWithStringValue(text.view());
 }
 
@@ -48,12 +60,11 @@ Ref<XQueryCommentExpr> XQueryCommentExpr::commentExprWithValue(Ref<XQueryExpr> v
   return make<XQueryCommentExpr>(std::move(value));
 }
 
-Value XQueryCommentExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryCommentExpr::computeValue(XQueryContext& context) const {
   NSMutableString text;
-  appendTextOf(_value, text, context);
-  const Ref<NSXMLNode> comment = XQueryXMLNodeComment(*text.string());
-  if (!comment) context._internal().raise(XQueryErrors::invalidComment.errorAtLine(exprLine()));
-  return comment;
+  if (appendTextOf(_value, text, context) == Part::Failed) return {};
+  if (const Ref<NSXMLNode> comment = XQueryXMLNodeComment(*text.string())) return comment;
+  return context._internal().fail(XQueryErrors::invalidComment.errorAtLine(exprLine()));
 }
 
 // --- processing instructions ---------------------------------------------------------------------
@@ -70,21 +81,22 @@ void XQueryProcessingInstructionExpr::bindInfoForProlog(XQueryProlog& prolog) {
   bindPart(_value, prolog);
 }
 
-Value XQueryProcessingInstructionExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryProcessingInstructionExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   auto& dynamic = context._internal();
   const NSXMLNameRef name = _name.evaluate(context, exprLine());
+  if (!name) return {};
   const Ref<NSString> target = NSString::stringWithView(name->expanded->localName);
   NSMutableString content;
-  appendTextOf(_value, content, context);
+  if (appendTextOf(_value, content, context) == Part::Failed) return {};
   if (content.view().find(NSStringView::ascii("?>")) != NSStringView::notFound) {
-    dynamic.raise(XQueryErrors::invalidInstruction.errorAtLine(exprLine()));
+    return dynamic.fail(XQueryErrors::invalidInstruction.errorAtLine(exprLine()));
   }
   Ref<NSXMLNode> instruction;
   if (target->length() > 0) {
     instruction = XQueryXMLNodePI(*target, *XQueryStringTrimLeadingWS(content.string()));
   }
-  if (!instruction) dynamic.raise(XQueryErrors::invalidType.errorAtLine(exprLine()));
+  if (!instruction) return dynamic.fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
   dynamic.setBaseURI(dynamic.baseURI(), instruction.get());
   return instruction;
 }
@@ -100,13 +112,15 @@ void XQueryDocumentExpr::bindInfoForProlog(XQueryProlog& prolog) {
   XQueryValueConstructor::bindInfoForProlog(prolog);
 }
 
-Value XQueryDocumentExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryDocumentExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   auto& dynamic = context._internal();
   const Ref<NSXMLDocument> document = NSXMLDocument::document();
   dynamic.setBaseURI(dynamic.baseURI(), document.get());
   XQueryDocumentContent content(*document, context, exprLine());
-  content.add(_value->evaluateWithContext(context));
+  const Value value = _value->evaluateWithContext(context);
+  if (XQueryHasFailed(value, context)) return {};
+  content.add(value);
   content.finish();
   return document;
 }
@@ -128,12 +142,12 @@ void XQueryNamespaceExpr::bindInfoForProlog(XQueryProlog& prolog) {
   bindPart(_value, prolog);
 }
 
-Value XQueryNamespaceExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryNamespaceExpr::computeValue(XQueryContext& context) const {
   if (_name->view() == "xml" || _name->view() == "xmlns") {
-    context._internal().raise(XQueryErrors::invalidNamespace.errorAtLine(exprLine()));
+    return context._internal().fail(XQueryErrors::invalidNamespace.errorAtLine(exprLine()));
   }
   NSMutableString URI;
-  appendTextOf(_value, URI, context);
+  if (appendTextOf(_value, URI, context) == Part::Failed) return {};
   return XQueryXMLNodeNamespace(*_name, *URI.string());
 }
 

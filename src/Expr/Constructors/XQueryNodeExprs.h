@@ -24,7 +24,7 @@ class XQueryTextExpr : public XQueryValueConstructor {
  public:
   [[nodiscard]] static Ref<XQueryTextExpr> textExprWithValue(Ref<XQueryExpr> value);
 
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   using XQueryValueConstructor::XQueryValueConstructor;
@@ -37,7 +37,7 @@ class XQueryCommentExpr : public XQueryValueConstructor {
  public:
   [[nodiscard]] static Ref<XQueryCommentExpr> commentExprWithValue(Ref<XQueryExpr> value);
 
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   using XQueryValueConstructor::XQueryValueConstructor;
@@ -53,7 +53,7 @@ class XQueryProcessingInstructionExpr : public XQueryExpr {
       Ref<XQueryExpr> name, Ref<XQueryExpr> value);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryProcessingInstructionExpr(Ref<XQueryExpr> name, Ref<XQueryExpr> value)
@@ -72,7 +72,7 @@ class XQueryDocumentExpr : public XQueryValueConstructor {
   [[nodiscard]] static Ref<XQueryDocumentExpr> documentWithExpr(Ref<XQueryExpr> expr);
   void bindInfoForProlog(XQueryProlog& prolog) override;
 
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   using XQueryValueConstructor::XQueryValueConstructor;
@@ -92,7 +92,7 @@ class XQueryNamespaceExpr : public XQueryExpr {
   // The declaration, known without evaluation; null when the value is not a literal string.
   Ref<NSXMLNode> constantNode() const;
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryNamespaceExpr(Ref<NSString> name, Ref<XQueryExpr> value)

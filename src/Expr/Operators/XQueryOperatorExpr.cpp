@@ -84,14 +84,13 @@ Value dispatch(int type, const Value& left, const Value& right, XQueryContext& c
   return evaluate ? evaluate(type, left, right, context) : Value();
 }
 
-// Invalid operands (null) and an error record become an error of the expression at `line`; a
-// negative line is none.
-[[noreturn]] void raiseFailure(const Value& answer, int64_t line, XQueryContext& context) {
+// What invalid operands (null) and an error record come to for the expression at `line`; a negative
+// line is none.
+[[gnu::cold]] Ref<XQueryError> errorFor(const Value& answer, int64_t line) {
   const auto* record = dyn_cast<XQueryError>(answer.get());
   const int64_t number = record ? record->err() : XQueryErrors::invalidOperand.number;
   const Ref<NSString> message = record ? record->msg() : XQueryErrors::invalidOperand.message();
-  context._internal().raise(line < 0 ? XQueryError::error(number, message)
-                                     : XQueryError::error(number, message, line));
+  return line < 0 ? XQueryError::error(number, message) : XQueryError::error(number, message, line);
 }
 
 bool isFailure(const Value& answer) {
@@ -155,18 +154,25 @@ void XQueryOperatorExpr::bindInfoForProlog(XQueryProlog& prolog) {
   }
 }
 
-Value XQueryOperatorExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryOperatorExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
-  if (!isa<XQueryOperatorExpr>(_left.get())) {
-    return evaluateWithLeftValue(_left ? _left->evaluateWithContext(context) : Value(), context);
-  }
+  if (isa<XQueryOperatorExpr>(_left.get())) return evaluateChain(context);
+  if (!_left) return evaluateWithLeftValue(Value(), context);
+  const Value left = _left->evaluateWithContext(context);
+  if (XQueryHasFailed(left, context)) return {};
+  return evaluateWithLeftValue(left, context);
+}
+
+Value XQueryOperatorExpr::evaluateChain(XQueryContext& context) const {
   const LeftSpine<const XQueryOperatorExpr> spine(this);
   Value value;
   if (const XQueryExpr* innermost = spine[spine.count() - 1]->left()) {
     value = innermost->evaluateWithContext(context);
+    if (XQueryHasFailed(value, context)) return {};
   }
   for (size_t index = spine.count(); index-- > 0;) {
     value = spine[index]->evaluateWithLeftValue(value, context);
+    if (XQueryHasFailed(value, context)) return {};
   }
   return value;
 }
@@ -175,20 +181,24 @@ Value XQueryOperatorExpr::evaluateWithLeftValue(const Value& left, XQueryContext
   if (_type == XQueryOperatorOr || _type == XQueryOperatorAnd) {
     const bool isTrue = XQueryIsTrue(XQueryEffectiveBooleanValue(leftOrEmpty(left), context));
     if (isTrue == (_type == XQueryOperatorOr)) return NSNumber::numberWithBool(isTrue);
-    return XQueryEffectiveBooleanValue(_right->evaluateWithContext(context), context);
+    const Value right = _right->evaluateWithContext(context);
+    if (XQueryHasFailed(right, context)) return {};
+    return XQueryEffectiveBooleanValue(right, context);
   }
   if (const XQueryOperatorExpr* range = rangeToCompareWith()) {
     return evaluateWithRange(left, *range, context);
   }
-  return answerFor(left, _right->evaluateWithContext(context), context);
+  const Value right = _right->evaluateWithContext(context);
+  if (XQueryHasFailed(right, context)) return {};
+  return answerFor(left, right, context);
 }
 
-// Raises what cannot be answered.
+// What cannot be answered is an error.
 Value XQueryOperatorExpr::answerFor(const Value& left, const Value& right,
                                     XQueryContext& context) const {
   Value answer = isSign() ? XQueryUnarySign(_type, right, context)
                           : dispatch(_type, leftOrEmpty(left), right, context);
-  if (isFailure(answer)) raiseFailure(answer, _line, context);
+  if (isFailure(answer)) return context._internal().fail(errorFor(answer, _line));
   return answer;
 }
 
@@ -209,9 +219,13 @@ const XQueryOperatorExpr* XQueryOperatorExpr::rangeIn(const XQueryExpr* expr) {
 XQueryRangeBounds XQueryOperatorExpr::rangeBounds(XQueryContext& context) const {
   XQueryCheckStack(context);
   const Value start = _left ? _left->evaluateWithContext(context) : Value();
+  if (XQueryHasFailed(start, context)) return {};
   const Value end = _right->evaluateWithContext(context);
+  if (XQueryHasFailed(end, context)) return {};
   XQueryRangeBounds bounds = XQueryRangeBoundsFrom(leftOrEmpty(start), end, context);
-  if (!bounds.areIntegers && isFailure(bounds.answer)) raiseFailure(bounds.answer, _line, context);
+  if (!bounds.areIntegers && isFailure(bounds.answer)) {
+    bounds.answer = context._internal().fail(errorFor(bounds.answer, _line));
+  }
   return bounds;
 }
 
@@ -219,7 +233,10 @@ XQueryRangeBounds XQueryOperatorExpr::rangeBounds(XQueryContext& context) const 
 Value XQueryOperatorExpr::evaluateWithRange(const Value& left, const XQueryOperatorExpr& range,
                                             XQueryContext& context) const {
   const XQueryRangeBounds bounds = range.rangeBounds(context);
-  if (!bounds.areIntegers) return answerFor(left, bounds.answer, context);
+  if (!bounds.areIntegers) {
+    if (XQueryHasFailed(bounds.answer, context)) return {};
+    return answerFor(left, bounds.answer, context);
+  }
   Value answer = XQueryGeneralComparisonWithRange(_type, left, bounds.first, bounds.last);
   return answer ? answer : answerFor(left, XQueryRangeIntegers(bounds, context), context);
 }
@@ -236,7 +253,7 @@ int XQueryOperatorExpr::operatorClassification(int type) {
 Value XQueryOperatorExpr::evaluateOperator(int type, const Value& withLeft, const Value& right,
                                            XQueryContext& forContext) {
   Value answer = dispatch(type, withLeft, right, forContext);
-  if (isFailure(answer)) raiseFailure(answer, -1, forContext);
+  if (isFailure(answer)) forContext._internal().raise(errorFor(answer, -1));
   return answer;
 }
 

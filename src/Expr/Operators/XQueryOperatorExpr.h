@@ -65,11 +65,11 @@ class XQueryOperatorExpr : public XQueryExpr {
   // The range operator that an expression is, in parentheses or not; null for any other
   // expression, which may be null.
   static const XQueryOperatorExpr* rangeIn(const XQueryExpr* expr);
-  // What the operands of a range operator come to; invalid ones are raised.
+  // What the operands of a range operator come to; no answer for one that has failed or is invalid.
   XQueryRangeBounds rangeBounds(XQueryContext& context) const;
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
   // 1 logical, 2 arithmetic, 3 range, 4 sequence, 5 value, 6 general, 7 node comparison; else 0.
   static int operatorClassification(int type);
@@ -103,6 +103,8 @@ class XQueryOperatorExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  // Out of line: the list of a chain's operators is no part of a recursion's frames otherwise.
+  [[gnu::noinline]] Value evaluateChain(XQueryContext& context) const;
   Value evaluateWithLeftValue(const Value& left, XQueryContext& context) const;
   Value evaluateWithRange(const Value& left, const XQueryOperatorExpr& range,
                           XQueryContext& context) const;

@@ -68,7 +68,7 @@ void XQueryNameTest::bindInfoForProlog(XQueryProlog& prolog) {
 Ref<XQueryQName> XQueryNameTest::qNameForContext(XQueryContext* context) const {
   if (!isDeferred()) return dyn_cast<XQueryQName>(_qName);
   if (context) {
-    return dyn_cast<XQueryQName>(cast<XQueryQNameReference>(_qName)->evaluateWithContext(*context));
+    return cast<XQueryQNameReference>(_qName)->qNameForContext(*context);
   }
   return nameWithoutNamespace() ? XQueryQName::qnameWithLocalPart(_name, nullptr) : nullptr;
 }
@@ -81,7 +81,7 @@ bool XQueryNameTest::isValidNode(const NSXMLNode& node, XQueryContext* context) 
          node.localNameView() == qName->localPart()->view();
 }
 
-Value XQueryNameTest::evaluateWithContext(XQueryContext&) const {
+Value XQueryNameTest::computeValue(XQueryContext&) const {
   return NSNull::null();
 }
 
@@ -104,8 +104,7 @@ void XQueryWildCardNameTest::bindInfoForProlog(XQueryProlog& prolog) {
 
 Ref<NSString> XQueryWildCardNameTest::uriForContext(XQueryContext* context) const {
   if (_uri || !_qNameReference || !context) return _uri;
-  const Value name = _qNameReference->evaluateWithContext(*context);
-  const auto* qName = dyn_cast<XQueryQName>(name);
+  const Ref<XQueryQName> qName = _qNameReference->qNameForContext(*context);
   return qName ? qName->namespaceURI() : nullptr;
 }
 
@@ -118,7 +117,7 @@ bool XQueryWildCardNameTest::isValidNode(const NSXMLNode& node, XQueryContext* c
   return !_localName || node.localNameView() == _localName->view();
 }
 
-Value XQueryWildCardNameTest::evaluateWithContext(XQueryContext&) const {
+Value XQueryWildCardNameTest::computeValue(XQueryContext&) const {
   return NSNull::null();
 }
 

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Expr/XQueryExpr.h"
+#include "Expr/XQueryLeaves.h"
 #include "Types/XQueryQName.h"
 #include "xquery/XMLNode.h"
 
@@ -42,7 +43,7 @@ class XQueryNameTest : public XQueryExpr {
   [[nodiscard]] static NSXMLExpandedNameRef interned(const XQueryQName& name);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   explicit XQueryNameTest(Ref<NSString> name)
@@ -75,7 +76,7 @@ class XQueryWildCardNameTest : public XQueryExpr {
   bool mayRaise() const { return static_cast<bool>(_qNameReference); }
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryWildCardNameTest(Ref<NSString> prefix, Ref<NSString> localName)
@@ -89,7 +90,7 @@ class XQueryWildCardNameTest : public XQueryExpr {
   Ref<NSString> _prefix;
   Ref<NSString> _localName;
   Ref<NSString> _uri;
-  Ref<XQueryExpr> _qNameReference;
+  Ref<XQueryQNameReference> _qNameReference;
 };
 
 }  // namespace xquery

@@ -192,6 +192,7 @@ void XQueryAxisStep::processValue(const Value& items, XQueryPathRun& run, bool v
   for (size_t i = 0; i < list.count(); ++i) {
     if (auto* node = dyn_cast<NSXMLNode>(list[i])) {
       processNode(node, run);
+      if (run.hasFailed) return;
     } else if (validate) {
       raiseNoNode(XQueryErrors::contextItemNotANode, run.context);
     }
@@ -199,7 +200,10 @@ void XQueryAxisStep::processValue(const Value& items, XQueryPathRun& run, bool v
 }
 
 void XQueryAxisStep::processNodes(const std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const {
-  for (NSXMLNode* node : nodes) processNode(node, run);
+  for (NSXMLNode* node : nodes) {
+    processNode(node, run);
+    if (run.hasFailed) return;
+  }
 }
 
 void XQueryAxisStep::processNode(NSXMLNode* node, XQueryPathRun& run) const {
@@ -249,12 +253,13 @@ void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& ru
   const XQueryStep* next = _next.get();
   const auto handOn = [matches, next, &run](NSXMLNode* found) {
     if (!matches(found)) return true;
-    if (next) {
-      next->processNode(found, run);
-    } else {
+    if (!next) {
       run.results.addNode(found, run.context);
+      return true;
     }
-    return true;
+    // A trail may go on after an error.
+    if (!run.hasFailed) next->processNode(found, run);
+    return !run.hasFailed;
   };
   if (_gathersFirst) {
     std::vector<NSXMLNode*>& nodes = run.openNodeList();
@@ -262,7 +267,10 @@ void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& ru
       if (matches(found)) nodes.push_back(found);
       return true;
     });
-    for (NSXMLNode* found : nodes) next->processNode(found, run);
+    for (NSXMLNode* found : nodes) {
+      if (run.hasFailed) break;
+      next->processNode(found, run);
+    }
     run.closeNodeList();
   } else if (_trail != noTrail && !run.setsEveryFocus) {
     run.trail(_trail).walk(node, axis, handOn);
@@ -280,8 +288,9 @@ void XQueryAxisStep::filter(int axis, NSXMLNode* node, XQueryPathRun& run) const
     run.listed->insert(run.listed->end(), nodes.begin(), nodes.end());
     return run.closeNodeList();
   }
-  filterNodes(nodes, predicatesDone, run.context);
-  if (_next) {
+  if (!filterNodes(nodes, predicatesDone, run.context)) {
+    run.hasFailed = true;
+  } else if (_next) {
     _next->processNodes(nodes, run);
   } else {
     WorkPacer pacer;
@@ -338,6 +347,7 @@ void XQueryFilterStep::processValue(const Value& items, XQueryPathRun& run, bool
   run.context._internal().setLast(static_cast<int64_t>(list.count()));
   for (size_t i = 0; i < list.count(); ++i) {
     processItem(list[i], static_cast<int64_t>(i) + 1, run, validate);
+    if (run.hasFailed) return;
   }
 }
 
@@ -351,6 +361,7 @@ void XQueryFilterStep::processNodes(const std::vector<NSXMLNode*>& nodes,
   run.context._internal().setLast(static_cast<int64_t>(nodes.size()));
   for (size_t i = 0; i < nodes.size(); ++i) {
     processItem(nodes[i], static_cast<int64_t>(i) + 1, run, false);
+    if (run.hasFailed) return;
   }
 }
 
@@ -361,7 +372,11 @@ void XQueryFilterStep::processItem(NSObject* item, int64_t position, XQueryPathR
   if (_next && !XQueryIsNode(item)) raiseNoNode(XQueryErrors::itemNotANode, context);
   context._internal().setContextItem(item, position);
   Value value = _expr ? _expr->evaluateWithContext(context) : Value(NSNull::null());
-  value = handlePreicatesFromIndex(0, std::move(value), context);
+  if (value) value = handlePreicatesFromIndex(0, std::move(value), context);
+  if (XQueryHasFailed(value, context)) {
+    run.hasFailed = true;
+    return;
+  }
   if (!_next) {
     run.results.add(value.get(), context);
     return;
@@ -385,9 +400,9 @@ Ref<XQueryRootStepExpr> XQueryRootStepExpr::expr() {
   return make<XQueryRootStepExpr>();
 }
 
-Value XQueryRootStepExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryRootStepExpr::computeValue(XQueryContext& context) const {
   const auto* node = dyn_cast<NSXMLNode>(context._internal().contextItem());
-  if (!node) raiseNoNode(XQueryErrors::contextItemNotANode, context);
+  if (!node) return context._internal().fail(XQueryErrors::contextItemNotANode.error());
   return XQueryTreatAs(node->rootNode(), *_type, context);
 }
 
@@ -442,13 +457,14 @@ void XQueryPathExpr::findGatheringSteps() {
   }
 }
 
-Value XQueryPathExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryPathExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   auto& dynamic = context._internal();
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
   Value contextItem = dynamic.contextItem();
   Value result = evaluateSteps(context);
+  if (XQueryHasFailed(result, context)) return {};
   // An error leaves the focus as it was when it was raised.
   dynamic.setContextItem(std::move(contextItem), position);
   dynamic.setLast(last);
@@ -461,6 +477,7 @@ Value XQueryPathExpr::evaluateSteps(XQueryContext& context) const {
   Value items = dynamic.contextItem();
   if (!isa<XQueryAxisStep>(step)) {
     items = step ? evaluateFirstStep(*step, context) : Value(NSNull::null());
+    if (XQueryHasFailed(items, context)) return {};
     if (step) step = step->next();
   }
   if (!step || isNull(items)) return items;
@@ -471,11 +488,13 @@ Value XQueryPathExpr::evaluateSteps(XQueryContext& context) const {
   run.orderIsFree = dynamic.ordered();
   run.trailCount = _trailCount;
   if (!_join || !joinNodes(items, *step, run)) step->processValue(items, run, true);
+  if (run.hasFailed) return {};
   return results.value(dynamic.ordered());
 }
 
 Value XQueryPathExpr::evaluateFirstStep(const XQueryStep& step, XQueryContext& context) const {
   Value items = step.expr() ? step.expr()->evaluateWithContext(context) : Value(NSNull::null());
+  if (XQueryHasFailed(items, context)) return {};
   if (_join && _join->step() == &step && joinItems(items, context)) return items;
   return step.handlePreicatesFromIndex(0, std::move(items), context);
 }
@@ -503,6 +522,9 @@ bool XQueryPathExpr::joinItems(Value& items, XQueryContext& context) const {
     const int64_t position = int64_t{match.position} + 1;
     if (_join->decides(match) || XQueryStep::keeps(predicate, item.get(), position, context)) {
       kept.add(item);
+    } else if (context._internal().isFailing()) {
+      items = Value();
+      return true;
     }
   }
   items = kept.value();
@@ -521,10 +543,12 @@ bool XQueryPathExpr::joinNodes(const Value& start, const XQueryStep& firstStep,
     listing.listingStep = joinStep;
     listing.listed = &listed;
     firstStep.processValue(start, listing, true);
-    return true;
+    run.hasFailed = listing.hasFailed;
+    return !listing.hasFailed;
   };
   XQueryJoinTable::Selection selection;
   const auto table = _join->select(*this, start, listNodes, run.context, selection);
+  if (run.hasFailed) return true;
   if (!table) return false;
   const XQueryExpr& predicate = *joinStep->predicates().front();
   std::vector<NSXMLNode*>& nodes = run.openNodeList();
@@ -533,6 +557,9 @@ bool XQueryPathExpr::joinNodes(const Value& start, const XQueryStep& firstStep,
     // The predicate cannot tell at which position the node stands.
     if (_join->decides(match) || XQueryStep::keeps(predicate, node, 1, run.context)) {
       nodes.push_back(node);
+    } else if (run.context._internal().isFailing()) {
+      run.hasFailed = true;
+      return true;
     }
   }
   if (joinStep->next()) {

@@ -51,9 +51,11 @@ class XQueryStep : public NSCounted {
   void setPredicates(std::vector<Ref<XQueryExpr>> predicates);
 
   virtual void bindInfoForProlog(XQueryProlog& prolog);
-  // Applies predicate `index` and those after it. The misspelling belongs to the name.
+  // Applies predicate `index` and those after it; null when a limit was reached. The misspelling
+  // belongs to the name.
   Value handlePreicatesFromIndex(size_t index, Value items, XQueryContext& context) const;
-  // Whether the predicate keeps the item.
+  // Whether the predicate keeps the item. An error that it meets is passed over, but for a limit:
+  // then the context is failing.
   static bool keeps(const XQueryExpr& predicate, NSObject* item, int64_t position,
                     XQueryContext& context);
   // Does nothing here.
@@ -64,8 +66,9 @@ class XQueryStep : public NSCounted {
   XQueryStep(Kind kind, Ref<XQueryExpr> initWithExpr)
       : NSCounted(kind), _expr(std::move(initWithExpr)) {}
 
-  // The same as handlePreicatesFromIndex over a list of nodes, in place.
-  void filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex, XQueryContext& context) const;
+  // The same as handlePreicatesFromIndex over a list of nodes, in place. False when a limit was
+  // reached.
+  bool filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex, XQueryContext& context) const;
   // Whether every predicate may be evaluated again (XQueryIsRepeatable).
   bool hasRepeatablePredicates(bool variablesMayChange) const;
   // Whether every predicate keeps an item for what it finds true of it, wherever the item stands,
@@ -86,7 +89,7 @@ class XQueryStep : public NSCounted {
  private:
   static std::optional<uint64_t> literalPositionOf(const XQueryExpr* predicate);
   // processItems within one evaluation of a path: for a value of any shape, for one node, and for
-  // the nodes that a step with predicates kept.
+  // the nodes that a step with predicates kept. All of them end the run (hasFailed) at an error.
   virtual void processValue(const Value& items, XQueryPathRun& run, bool validate) const;
   virtual void processNode(NSXMLNode* node, XQueryPathRun& run) const;
   virtual void processNodes(const std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const;
@@ -191,7 +194,7 @@ class XQueryRootStepExpr : public XQueryExpr {
   [[nodiscard]] static Ref<XQueryRootStepExpr> expr();
   void bindInfoForProlog(XQueryProlog&) override {}
   // The document node above the context item.
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryRootStepExpr();
@@ -209,7 +212,7 @@ class XQueryPathExpr : public XQueryExpr {
   XQueryStep* step() const { return _step.get(); }
   // The chain of steps does not change afterwards.
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   explicit XQueryPathExpr(Ref<XQueryStep> step)

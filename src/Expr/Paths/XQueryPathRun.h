@@ -25,6 +25,8 @@ class XQueryPathRun {
   // An axis step makes each of its context items the focus. Nobody can see that focus, except where
   // an error leaves it behind, so it is left out unless an error may arise from the items.
   bool setsEveryFocus = true;
+  // An error has come up: the steps hand nothing on any more.
+  bool hasFailed = false;
   // The results will be sorted, so the order in which nodes arrive is free.
   bool orderIsFree = false;
 

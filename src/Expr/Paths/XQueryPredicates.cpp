@@ -3,7 +3,8 @@
 // A numeric literal selects by position and is never evaluated. Any other predicate is evaluated
 // once per item with the item as focus; a number selects by position, anything else by its truth.
 // An error in a predicate drops the item it arose for and nothing more: a path over irregular data
-// keeps what fits. Reaching an engine limit is no such error and ends the evaluation.
+// keeps what fits, and the focus is what it was before the predicate was evaluated. Reaching an
+// engine limit is no such error and ends the evaluation.
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryPath.h"
@@ -48,6 +49,7 @@ bool selects(const Value& result, int64_t position, XQueryContext& context) {
   return XQueryIsTrue(XQueryEffectiveBooleanValue(result, context));
 }
 
+// Null when a limit was reached.
 Value keptItems(const Value& items, const XQueryExpr& predicate, XQueryContext& context) {
   const XQueryItemList list(items.get());
   context._internal().setLast(static_cast<int64_t>(list.count()));
@@ -56,20 +58,26 @@ Value keptItems(const Value& items, const XQueryExpr& predicate, XQueryContext& 
     NSObject* item = list[i];
     const bool isKept = XQueryStep::keeps(predicate, item, static_cast<int64_t>(i) + 1, context);
     if (isKept && item && item->kind() != Kind::Null) kept.add(item);
+    if (context._internal().isFailing()) return {};
   }
   return kept.value();
 }
 
-void keepNodes(std::vector<NSXMLNode*>& nodes, const XQueryExpr& predicate,
+// False when a limit was reached.
+bool keepNodes(std::vector<NSXMLNode*>& nodes, const XQueryExpr& predicate,
                XQueryContext& context) {
   context._internal().setLast(static_cast<int64_t>(nodes.size()));
   size_t kept = 0;
   for (size_t i = 0; i < nodes.size(); ++i) {
     NSXMLNode* node = nodes[i];
-    if (XQueryStep::keeps(predicate, node, static_cast<int64_t>(i) + 1, context))
+    if (XQueryStep::keeps(predicate, node, static_cast<int64_t>(i) + 1, context)) {
       nodes[kept++] = node;
+    } else if (context._internal().isFailing()) {
+      return false;
+    }
   }
   nodes.resize(kept);
+  return true;
 }
 
 // Whether the expression's value is never a number.
@@ -105,13 +113,14 @@ bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t posi
   checkWork();
   auto& dynamic = context._internal();
   dynamic.setContextItem(item, position);
-  try {
-    return selects(predicate.evaluateWithContext(context), position, context);
-  } catch (const NSException&) {
-    if (XQueryIsLimit(dynamic.error().get())) throw;
-    dynamic.setError(nullptr, false);
-    return false;
-  }
+  const int64_t last = dynamic.last();
+  const Value result = predicate.evaluateWithContext(context);
+  if (!XQueryHasFailed(result, context)) return selects(result, position, context);
+  if (dynamic.isFailingForGood()) return false;
+  dynamic.passOverFailure(nullptr);
+  dynamic.setContextItem(item, position);
+  dynamic.setLast(last);
+  return false;
 }
 
 std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicate) {
@@ -140,7 +149,7 @@ Value XQueryStep::handlePreicatesFromIndex(size_t index, Value items,
   return items;
 }
 
-void XQueryStep::filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex,
+bool XQueryStep::filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex,
                              XQueryContext& context) const {
   for (size_t index = fromIndex; index < _predicates.size(); ++index) {
     const XQueryExpr* predicate = _predicates[index].get();
@@ -149,10 +158,11 @@ void XQueryStep::filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex,
       const bool isThere = *position >= 1 && *position <= nodes.size();
       if (isThere) nodes[0] = nodes[*position - 1];
       nodes.resize(isThere ? 1 : 0);
-    } else {
-      keepNodes(nodes, *predicate, context);
+    } else if (!keepNodes(nodes, *predicate, context)) {
+      return false;
     }
   }
+  return true;
 }
 
 }  // namespace xquery

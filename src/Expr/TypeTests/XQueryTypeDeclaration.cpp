@@ -149,7 +149,7 @@ void XQueryTypeDeclaration::bindInfoForProlog(XQueryProlog& prolog) {
   }
 }
 
-Value XQueryTypeDeclaration::evaluateWithContext(XQueryContext&) const {
+Value XQueryTypeDeclaration::computeValue(XQueryContext&) const {
   return NSNull::null();
 }
 

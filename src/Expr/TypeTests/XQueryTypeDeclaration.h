@@ -53,7 +53,7 @@ class XQueryTypeDeclaration : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   // A declaration is never evaluated for a value: NSNull.
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
   XQueryTypeDeclaration(int type, Value data);
 

@@ -30,8 +30,10 @@ Value XQueryInstanceOfExpr::object(const Value& object, const XQueryTypeDeclarat
   return NSNumber::numberWithBool(XQueryInstanceOf(object.get(), instanceOf, forContext));
 }
 
-Value XQueryInstanceOfExpr::evaluateWithContext(XQueryContext& context) const {
-  return object(operand(context), *_type, &context);
+Value XQueryInstanceOfExpr::computeValue(XQueryContext& context) const {
+  const Value value = operand(context);
+  if (XQueryHasFailed(value, context)) return {};
+  return object(value, *_type, &context);
 }
 
 Ref<XQueryTreatExpr> XQueryTreatExpr::treatExpr(Ref<XQueryExpr> expr,
@@ -39,8 +41,10 @@ Ref<XQueryTreatExpr> XQueryTreatExpr::treatExpr(Ref<XQueryExpr> expr,
   return make<XQueryTreatExpr>(std::move(expr), std::move(asType));
 }
 
-Value XQueryTreatExpr::evaluateWithContext(XQueryContext& context) const {
-  return object(operand(context), *_type, context);
+Value XQueryTreatExpr::computeValue(XQueryContext& context) const {
+  const Value value = operand(context);
+  if (XQueryHasFailed(value, context)) return {};
+  return object(value, *_type, context);
 }
 
 Ref<XQueryCastExpr> XQueryCastExpr::castExpr(Ref<XQueryExpr> expr,
@@ -48,15 +52,16 @@ Ref<XQueryCastExpr> XQueryCastExpr::castExpr(Ref<XQueryExpr> expr,
   return make<XQueryCastExpr>(std::move(expr), std::move(asType));
 }
 
-Value XQueryCastExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryCastExpr::computeValue(XQueryContext& context) const {
   const Value value = operand(context);
+  if (XQueryHasFailed(value, context)) return {};
   Value result;
   if (_type->type() == XQueryTypeDeclaration::Atomic) {
     const bool allowEmpty = _type->occuranceType() == XQueryTypeDeclaration::ZeroOrOne;
     result = castObject(value, _type->typeID(), context, allowEmpty);
   }
-  if (!result) context._internal().raise(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
-  return result;
+  if (result) return result;
+  return context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
 }
 
 Ref<XQueryCastableExpr> XQueryCastableExpr::castableExpr(Ref<XQueryExpr> expr,
@@ -64,12 +69,13 @@ Ref<XQueryCastableExpr> XQueryCastableExpr::castableExpr(Ref<XQueryExpr> expr,
   return make<XQueryCastableExpr>(std::move(expr), std::move(asType));
 }
 
-Value XQueryCastableExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryCastableExpr::computeValue(XQueryContext& context) const {
   auto& dynamic = context._internal();
   const Value value = normalised(operand(context));
+  if (XQueryHasFailed(value, context)) return {};
   // Several items are an error here, not merely not castable.
   if (_type->type() != XQueryTypeDeclaration::Atomic || isa<NSArray>(value)) {
-    dynamic.raise(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
+    return dynamic.fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
   }
   try {
     const Value cast = XQueryCastExpr::castObject(value, _type->typeID(), context, true);

@@ -31,7 +31,7 @@ class XQueryInstanceOfExpr : public XQueryTypedExpr {
   // One of the shared truth values. `forContext` may be null.
   static Value object(const Value& object, const XQueryTypeDeclaration& instanceOf,
                       XQueryContext* forContext);
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   using XQueryTypedExpr::XQueryTypedExpr;
@@ -48,7 +48,7 @@ class XQueryTreatExpr : public XQueryTypedExpr {
                       XQueryContext& forContext) {
     return XQueryTreatAs(object, treatAs, forContext);
   }
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   using XQueryTypedExpr::XQueryTypedExpr;
@@ -65,7 +65,7 @@ class XQueryCastExpr : public XQueryTypedExpr {
                           bool allowEmpty) {
     return XQueryCastObject(object, asType, forContext, allowEmpty);
   }
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   using XQueryTypedExpr::XQueryTypedExpr;
@@ -77,7 +77,7 @@ class XQueryCastableExpr : public XQueryTypedExpr {
  public:
   [[nodiscard]] static Ref<XQueryCastableExpr> castableExpr(Ref<XQueryExpr> expr,
                                                             Ref<XQueryTypeDeclaration> asType);
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   using XQueryTypedExpr::XQueryTypedExpr;

@@ -50,19 +50,20 @@ Value XQueryTypeswitchExpr::evaluateClause(const XQueryCaseClauseExpr& clause, c
   const Value former = dynamic.variableForID(clause.varID());
   dynamic.setVariable(value, clause.varID());
   Value result = clause.evaluateWithContext(context);
+  if (XQueryHasFailed(result, context)) return {};
   // A variable that was empty before stays bound to the operand.
   if (former) dynamic.setVariable(former, clause.varID());
   return result;
 }
 
-Value XQueryTypeswitchExpr::evaluateWithContext(XQueryContext& context) const {
+Value XQueryTypeswitchExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   const Value value = XQueryEvaluateOrEmpty(_expr.get(), context);
-  if (isa<XQueryError>(value)) return value;
+  if (XQueryHasFailed(value, context) || isa<XQueryError>(value)) return value;
   const XQueryCaseClauseExpr* clause = clauseFor(value.get(), context);
   Value result = clause ? evaluateClause(*clause, value, context) : Value();
-  if (!result) context._internal().raise(XQueryErrors::invalidType.errorAtLine(exprLine()));
-  return result;
+  if (result || context._internal().isFailing()) return result;
+  return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
 }
 
 }  // namespace xquery

@@ -31,7 +31,7 @@ class XQueryTypeswitchExpr : public XQueryExpr {
                                                       CaseClauses withCaseClauses);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
-  Value evaluateWithContext(XQueryContext& context) const override;
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryTypeswitchExpr(Ref<XQueryExpr> expr, CaseClauses caseClauses);

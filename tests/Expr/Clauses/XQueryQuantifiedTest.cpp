@@ -32,7 +32,7 @@ class Quantified : public BindingTesting {
         [this, references, values](XQueryContext& with) {
           std::string line;
           for (const auto& each : references) {
-            const Value value = each->evaluateWithContext(with);
+            const Value value = evaluatedOrThrown(*each, with);
             line += (line.empty() ? "" : " ") + XQueryStringValue(*value)->utf8();
           }
           log.push_back(line);

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "Context/XQueryContextInternal.h"
+#include "Expr/Evaluated.h"
 #include "Expr/XQueryLeaves.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
@@ -29,7 +30,7 @@ class Constructors : public testing::Test {
    public:
     explicit Constant(Value value) : XQueryExpr(Kind::OtherExpr), _value(std::move(value)) {}
     void bindInfoForProlog(XQueryProlog&) override {}
-    Value evaluateWithContext(XQueryContext&) const override { return _value; }
+    Value computeValue(XQueryContext&) const override { return _value; }
 
    private:
     Value _value;
@@ -57,7 +58,7 @@ class Constructors : public testing::Test {
   // Binds and evaluates in the fixture's prolog and context.
   Value evaluated(XQueryExpr& expr) {
     expr.bindInfoForProlog(*prolog);
-    return expr.evaluateWithContext(*context);
+    return evaluatedOrThrown(expr, *context);
   }
   std::string xmlOf(XQueryExpr& expr) {
     const Value value = evaluated(expr);

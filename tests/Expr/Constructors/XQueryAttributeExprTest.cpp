@@ -70,7 +70,7 @@ TEST_F(AttributeExpr, InALibraryModuleAPrefixThatDoesNotResolveIsAnError) {
 
 TEST_F(AttributeExpr, WithoutANameThereIsNoAttribute) {
   const auto expr = XQueryAttributeExpr::attributeExprWithName(text("a"), {}, u'"');
-  EXPECT_THROW(expr->evaluateWithContext(*context), NSException) << "it was never bound";
+  EXPECT_THROW(evaluatedOrThrown(*expr, *context), NSException) << "it was never bound";
   EXPECT_EQ(context->_internal().error()->msg()->utf8(), "can't resolve QName for \"a\"");
   EXPECT_EQ(context->_internal().error()->err(), 1);
 }

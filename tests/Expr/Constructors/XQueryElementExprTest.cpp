@@ -404,7 +404,7 @@ TEST_F(ElementExpr, NestingIsBoundedByTheStackWhileEvaluating) {
         XQueryQNameReference::qNameReferenceWithQName(XQueryQName::qname(text("a"), nullptr), 0),
         expr);
   }
-  EXPECT_THROW(expr->evaluateWithContext(*context), NSException);
+  EXPECT_THROW(evaluatedOrThrown(*expr, *context), NSException);
   EXPECT_EQ(context->_internal().error()->msg()->utf8(), "limit: expression nested too deeply");
 }
 

@@ -168,7 +168,7 @@ TEST_F(NodeExprs, NestingIsBoundedByTheStack) {
   expr->bindInfoForProlog(*prolog);
   // Binding may need no stack at all, where its last call is a jump; evaluating always does.
   EXPECT_LE(prolog->errors().size(), 1U);
-  EXPECT_THROW(expr->evaluateWithContext(*context), NSException);
+  EXPECT_THROW(evaluatedOrThrown(*expr, *context), NSException);
   EXPECT_EQ(context->_internal().error()->msg()->utf8(), "limit: expression nested too deeply");
 }
 

@@ -1,3 +1,4 @@
+#include "Expr/Evaluated.h"
 #include "Expr/Operators/OperatorTestSupport.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLeaves.h"
@@ -26,7 +27,7 @@ class Probe : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog&) override {
     if (_log) _log->push_back("bind " + _name);
   }
-  Value evaluateWithContext(XQueryContext&) const override {
+  Value computeValue(XQueryContext&) const override {
     ++evaluations;
     if (_log) _log->push_back(_name);
     return _value;
@@ -57,7 +58,7 @@ Ref<XQueryExpr> literal(Value value) {
 }
 
 std::string evaluateExpr(const XQueryExpr& expr) {
-  return outcome([&](XQueryContext& context) { return expr.evaluateWithContext(context); });
+  return outcome([&](XQueryContext& context) { return evaluatedOrThrown(expr, context); });
 }
 
 TEST(OperatorClassification, EveryCodeHasItsClass) {
@@ -146,7 +147,7 @@ TEST(OperatorExpr, InvalidOperandsAreReportedAtTheLineOfTheOperator) {
   const auto expr = binary(XQueryOperatorPlus, literal(string("a")), literal(integer(1)));
   expr->setExprLine(4);
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
-  EXPECT_THROW((void)expr->evaluateWithContext(*context), NSException);
+  EXPECT_THROW((void)evaluatedOrThrown(*expr, *context), NSException);
   const Ref<XQueryError>& error = context->_internal().error();
   ASSERT_TRUE(error);
   EXPECT_EQ(error->err(), 6);
@@ -158,7 +159,7 @@ TEST(OperatorExpr, AnErrorRecordIsReportedAtTheLineOfTheOperator) {
   const auto expr = binary(XQueryOperatorDiv, literal(integer(1)), literal(integer(0)));
   expr->setExprLine(2);
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
-  EXPECT_THROW((void)expr->evaluateWithContext(*context), NSException);
+  EXPECT_THROW((void)evaluatedOrThrown(*expr, *context), NSException);
   EXPECT_EQ(context->_internal().error()->msg()->utf8(), "Division by zero");
   EXPECT_EQ(context->_internal().error()->line(), 3);
 }
@@ -274,7 +275,7 @@ TEST(ComparisonWithRange, BadBoundsFailAtTheLineOfTheRange) {
   bounds->setExprLine(7);
   const auto expr = binary(XQueryOperatorEqual, literal(integer(5)), bounds);
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
-  EXPECT_THROW((void)expr->evaluateWithContext(*context), NSException);
+  EXPECT_THROW((void)evaluatedOrThrown(*expr, *context), NSException);
   EXPECT_EQ(context->_internal().error()->msg()->utf8(), "invalid type for operator");
   EXPECT_EQ(context->_internal().error()->line(), 8);
 }

@@ -101,7 +101,7 @@ class PlainPath {
     for (size_t p = 1; p <= nodes.size(); ++p) {
       focus.setContextItem(nodes[p - 1], static_cast<int64_t>(p));
       try {
-        const Value result = predicate.evaluateWithContext(_context);
+        const Value result = evaluatedOrThrown(predicate, _context);
         const auto* number = dyn_cast<NSNumber>(result);
         const bool keep =
             number && !number->isBoolean()
@@ -110,6 +110,8 @@ class PlainPath {
         if (keep) kept.push_back(nodes[p - 1]);
       } catch (const NSException&) {
         focus.setError(nullptr, false);
+        focus.setContextItem(nodes[p - 1], static_cast<int64_t>(p));
+        focus.setLast(static_cast<int64_t>(nodes.size()));
       }
     }
     return kept;

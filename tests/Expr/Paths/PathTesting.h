@@ -139,7 +139,7 @@ class PathTesting : public testing::Test {
   // Binds in a main module and evaluates.
   Value evaluate(const Ref<XQueryExpr>& expr) {
     expr->bindInfoForProlog(*prolog);
-    return expr->evaluateWithContext(*context);
+    return evaluatedOrThrown(*expr, *context);
   }
   Value evaluate(const Steps& steps) { return evaluate(path(steps)); }
   Value evaluateFrom(const Value& item, const Steps& steps) {

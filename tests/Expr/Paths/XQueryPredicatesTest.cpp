@@ -9,7 +9,9 @@ class PredicatesTest : public PathTesting {
  protected:
   std::string kept(const Value& items, Predicates predicates, size_t fromIndex = 0) {
     const auto holder = filterStep(nullptr, std::move(predicates));
-    return shown(holder->handlePreicatesFromIndex(fromIndex, items, *context));
+    const Value value = holder->handlePreicatesFromIndex(fromIndex, items, *context);
+    if (XQueryHasFailed(value, *context)) context->_internal().throwFailure();
+    return shown(value);
   }
   // Predicates over nodes, through a step.
   std::string keptChildren(std::string_view childName, Predicates predicates) {
