@@ -16,9 +16,9 @@ class XQueryProlog;
 // Whether enough stack is left to go one level deeper.
 bool XQueryStackHasRoom();
 
-// Down to which address a stack of that size, whose lowest address is the base, may grow. Of one
-// without a limit, such as a main thread's after "ulimit -s unlimited", not all is used: an endless
-// recursion would take all memory before it came to the end.
+// Down to which address a stack of that size, whose lowest address is the base, may grow. Of a very
+// large one, such as a main thread's after "ulimit -s unlimited", not all is used: an endless
+// recursion would take all memory before it came to the end, or the time that a limit has.
 uintptr_t XQueryLowestStackAddress(uintptr_t base, size_t size);
 
 // What XQueryCheckStack does when its two comparisons do not settle the matter.

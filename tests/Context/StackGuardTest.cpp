@@ -21,8 +21,7 @@ size_t usedOf(size_t size) {
 TEST(StackGuard, LeavesThePartBelowTheDeepestFrameFree) {
   const size_t kept = XQueryLowestStackAddress(base, 8192 * kibibyte) - base;
   EXPECT_GE(kept, 256 * kibibyte);
-  EXPECT_EQ(XQueryLowestStackAddress(base, gibibyte) - base, kept);
-  EXPECT_EQ(XQueryLowestStackAddress(base, 60 * gibibyte) - base, kept);
+  EXPECT_EQ(XQueryLowestStackAddress(base, 65536 * kibibyte) - base, kept);
 }
 
 TEST(StackGuard, OfASmallStackHalfIsUsed) {
@@ -30,9 +29,12 @@ TEST(StackGuard, OfASmallStackHalfIsUsed) {
   EXPECT_EQ(usedOf(0), 0U);
 }
 
-TEST(StackGuard, OfAStackWithoutALimitAGibibyteIsUsed) {
-  EXPECT_EQ(usedOf(64 * gibibyte), gibibyte);
-  EXPECT_EQ(usedOf(100000 * gibibyte), gibibyte);
+TEST(StackGuard, OfAVeryLargeStackNotAllIsUsed) {
+  const size_t most = usedOf(64 * gibibyte);
+  EXPECT_LE(most, gibibyte);
+  EXPECT_GE(most, gibibyte / 8);
+  EXPECT_EQ(usedOf(2 * gibibyte), most);
+  EXPECT_EQ(usedOf(100000 * gibibyte), most);
 }
 
 // Sets a limit of the process for a while.

@@ -5,6 +5,7 @@
 #include <fstream>
 #include <iterator>
 #include <stdexcept>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -75,7 +76,13 @@ Outcome start(const std::string& program, const std::vector<std::string>& argume
 
   Outcome outcome;
   int status = 0;
-  waitpid(child, &status, 0);
+  rusage usage = {};
+  wait4(child, &status, 0, &usage);
+  const auto seconds = [](const timeval& time) {
+    return static_cast<double>(time.tv_sec) + 1e-6 * static_cast<double>(time.tv_usec);
+  };
+  outcome.processorSeconds = seconds(usage.ru_utime) + seconds(usage.ru_stime);
+  outcome.mostMemory = static_cast<size_t>(usage.ru_maxrss) * 1024;
   outcome.status = WIFEXITED(status) ? WEXITSTATUS(status) : -WTERMSIG(status);
   outcome.out = readFile(out);
   outcome.err = readFile(err);

@@ -1,6 +1,7 @@
 // Runs the built command as a process.
 #pragma once
 
+#include <cstddef>
 #include <filesystem>
 #include <string>
 #include <vector>
@@ -11,6 +12,8 @@ struct Outcome {
   int status = -1;  // the exit status; minus the signal's number when one ended the process
   std::string out;
   std::string err;
+  size_t mostMemory = 0;  // in bytes, at any time
+  double processorSeconds = 0;
 };
 
 // Where a program's output goes.
