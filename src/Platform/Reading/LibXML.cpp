@@ -26,6 +26,10 @@ namespace {
 // looked for when input is read and when entities and defaults, which need no reading, add to the
 // document. The content of an entity is parsed by an inner parser of libxml2's, which calls the
 // same functions.
+//
+// What libxml2 hands to whoever hears its errors depends on the way the report takes: what belongs
+// to the parser, to its validation context (the parser itself), or to nobody, such as failures of
+// encodings and of buffers. All of them arrive at the thread's parse.
 class Parse {
  public:
   Parse(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error)
@@ -35,6 +39,7 @@ class Parse {
  private:
   static xmlSAXHandler callbacks();
   static Parse& of(void* self) { return *static_cast<Parse*>(self); }
+  class Hearing;
   template <class Function>
   void guarded(Function function);
   void fail(const char* message);
@@ -69,7 +74,9 @@ class Parse {
   static void comment(void* self, const xmlChar* text);
   static void processingInstruction(void* self, const xmlChar* target, const xmlChar* text);
   static void reference(void* self, const xmlChar* name);
-  static void hearError(void* self, xmlError* error);
+  static void hearError(void*, xmlError* error);
+  static void hearText(void*, const char* format, ...);
+  void hear(const xmlError& error);
 
   const LibXMLReader& _read;
   LibXMLHandler& _handler;
@@ -138,11 +145,53 @@ void Parse::guarded(Function function) {
   }
 }
 
-void Parse::hearError(void* self, xmlError* error) {
-  Parse& parse = of(self);
-  // Warnings, for example of a namespace URI that is relative, do not make a document bad.
-  if (parse._failed || error->level < XML_ERR_ERROR) return;
-  parse.failAt(error->message, error->line, error->int2);
+// The innermost of this thread.
+thread_local Parse* current = nullptr;
+
+// Takes what libxml2 reports on this thread while it lives: what a host has set for the thread is
+// put back.
+class Parse::Hearing {
+ public:
+  explicit Hearing(Parse& parse) {
+    current = &parse;
+    xmlSetStructuredErrorFunc(nullptr, hearError);
+    xmlSetGenericErrorFunc(nullptr, hearText);
+  }
+  ~Hearing() {
+    xmlSetGenericErrorFunc(_genericContext, _generic);
+    xmlSetStructuredErrorFunc(_structuredContext, _structured);
+    current = _outer;
+  }
+  Hearing(const Hearing&) = delete;
+  Hearing& operator=(const Hearing&) = delete;
+
+ private:
+  Parse* const _outer = current;
+  const xmlStructuredErrorFunc _structured = xmlStructuredError;
+  void* const _structuredContext = xmlStructuredErrorContext;
+  const xmlGenericErrorFunc _generic = xmlGenericError;
+  void* const _genericContext = xmlGenericErrorContext;
+};
+
+void Parse::hearError(void*, xmlError* error) {
+  current->hear(*error);
+}
+
+void Parse::hearText(void*, const char*, ...) {}
+
+void Parse::hear(const xmlError& error) {
+  // Neither warnings, for example of a namespace URI that is relative, nor breaches of validity and
+  // of good sense, for example a token that an enumeration has twice or a predefined entity
+  // declared otherwise, make a document bad.
+  const bool isMinor = error.level < XML_ERR_FATAL &&
+                       (error.level < XML_ERR_ERROR || error.domain == XML_FROM_DTD ||
+                        error.domain == XML_FROM_VALID || error.domain == XML_FROM_TREE);
+  if (_failed || isMinor) return;
+  // What concerns the input is heard while it is read, when the parser cannot be stopped.
+  const bool isOfInput = error.domain != XML_FROM_PARSER && error.domain != XML_FROM_NAMESPACE;
+  if (!isOfInput) return failAt(error.message, error.line, error.int2);
+  const xmlParserInput* input = _parser->input;
+  note(error.message, input ? input->line : 0, input ? input->col : 0);
 }
 
 // --- input -----------------------------------------------------------------------------------
@@ -340,6 +389,7 @@ bool Parse::run() {
       xmlCreateIOParserCtxt(&handler, this, readInput, nullptr, this, XML_CHAR_ENCODING_NONE));
   if (!parser) throw std::bad_alloc();
   _parser = parser.get();
+  const Hearing hearing(*this);
   xmlCtxtUseOptions(_parser, XML_PARSE_HUGE | XML_PARSE_NOENT | XML_PARSE_NONET);
   const bool isWellFormed = xmlParseDocument(_parser) == 0 && _parser->wellFormed;
   if (!_failed && !isWellFormed) fail(nullptr);

@@ -1,0 +1,233 @@
+// Documents with every kind of declaration, sound and unsound, and every way in which the reading
+// of them ends.
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/LibXML.h"
+#include "xquery/XMLNode.h"
+
+#include <gtest/gtest.h>
+#include <libxml/xmlerror.h>
+
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+// Each as it stands in an internal subset; all are well-formed.
+const std::vector<std::string> declarations = {
+    "<!ELEMENT a EMPTY>",
+    "<!ELEMENT a ANY><!ELEMENT a ANY>",
+    "<!ELEMENT a (#PCDATA)>",
+    "<!ELEMENT a (#PCDATA|b|b|c)*>",
+    "<!ELEMENT a (b,(c|d)?,(e+|(f,g)*)+,b)>",
+    "<!ATTLIST a x CDATA #IMPLIED>",
+    "<!ATTLIST a x CDATA #REQUIRED y ID #IMPLIED z ID #IMPLIED>",
+    "<!ATTLIST a x IDREF 'one' y IDREFS 'one two'>",
+    "<!ATTLIST a x ENTITY 'u' y ENTITIES 'u u'>",
+    "<!ATTLIST a x NMTOKEN ' t ' y NMTOKENS ' t  u '>",
+    "<!ATTLIST a x (one|two) 'two'>",
+    "<!ATTLIST a x (one|one) #IMPLIED>",
+    "<!ATTLIST a x (one | two | one | two) 'three'>",
+    "<!ATTLIST a x NOTATION (q) #IMPLIED>",
+    "<!ATTLIST a x NOTATION (q|q) 'q'>",
+    "<!ATTLIST a x CDATA #FIXED 'f' x CDATA 'again'><!ATTLIST a x ID #IMPLIED>",
+    "<!ATTLIST a xmlns CDATA 'u' xmlns:p CDATA 'v' xml:space (default|preserve) 'preserve'>",
+    "<!ATTLIST undeclared x CDATA ''>",
+    "<!ENTITY e 'text'>",
+    "<!ENTITY e 'one'><!ENTITY e 'two'>",
+    "<!ENTITY e '<b>&f;</b>'><!ENTITY f '&#60;&#x26;'>",
+    "<!ENTITY lt 'no'><!ENTITY amp '&#38;#38;'>",
+    "<!ENTITY e SYSTEM 'nowhere'>",
+    "<!ENTITY e PUBLIC '-//p' 'nowhere'>",
+    "<!ENTITY u SYSTEM 'nowhere' NDATA q><!ENTITY u SYSTEM 'nowhere' NDATA r>",
+    "<!ENTITY % p '<!ATTLIST a x (one|one) #IMPLIED>'>%p;",
+    "<!ENTITY % t 'one|two|one'><!ENTITY % p '<!ATTLIST a x (&#37;t;) #IMPLIED>'>%p;",
+    "<!ENTITY % p ''><!ENTITY % p 'x'>%p;",
+    "<!ENTITY % p SYSTEM 'nowhere'>",
+    "<!NOTATION q SYSTEM 'x'><!NOTATION q PUBLIC 'y'>",
+    "<!NOTATION q PUBLIC '-//p' 'x'>",
+    "<!-- a comment -->",
+    "<?an instruction?>",
+    " \t\r\n",
+};
+
+// Each is a breach of well-formedness.
+const std::vector<std::string> unsound = {
+    "<!ELEMENT a>",
+    "<!ELEMENT a (b,c|d)>",
+    "<!ELEMENT a (b>",
+    "<!ELEMENT a (#PCDATA|b)>",
+    "<!ATTLIST a x (one|) #IMPLIED>",
+    "<!ATTLIST a x (one|one #IMPLIED>",
+    "<!ATTLIST a x NOTATION () #IMPLIED>",
+    "<!ATTLIST a x NOTATION (q|q #IMPLIED>",
+    "<!ATTLIST a x CDATA>",
+    "<!ATTLIST a x CDATA '<'>",
+    "<!ATTLIST a x CDATA '&nope;'>",
+    "<!ATTLIST a x NOTHING #IMPLIED>",
+    "<!ENTITY e>",
+    "<!ENTITY e '%p;'>",
+    "<!ENTITY e '&'>",
+    "<!ENTITY % e SYSTEM 'nowhere' NDATA q>",
+    "<!NOTATION q>",
+    "<![INCLUDE[<!ELEMENT a ANY>]]>",
+    "<![IGNORE[<!ELEMENT a ANY>]]>",
+    "<!-- -- -->",
+    "<?xml version='1.0'?>",
+    "%p;",
+    "<!NONSENSE>",
+    "text",
+};
+
+std::string withSubset(std::string_view declared) {
+  return "<!DOCTYPE a [" + std::string(declared) + "]><a>text</a>";
+}
+
+std::string withAll() {
+  std::string all;
+  for (const std::string& each : declarations) all += each;
+  return withSubset(all);
+}
+
+// Ends the work of the thread at a given look.
+struct Ended {};
+class LookCounter final : public WorkWatcher {
+ public:
+  explicit LookCounter(int looks) : _looksLeft(looks), _outer(workMeter) {
+    workMeter.watcher = this;
+    workMeter.stepsLeft = 0;
+  }
+  ~LookCounter() {
+    workMeter.watcher = _outer.watcher;
+    workMeter.stepsLeft = _outer.stepsLeft;
+  }
+  void lookAtWork() override {
+    workMeter.stepsLeft = 0;
+    if (_looksLeft-- <= 0) throw Ended();
+  }
+
+ private:
+  int _looksLeft;
+  const WorkMeter _outer;
+};
+
+TEST(XMLDeclarations, EveryKindIsRead) {
+  for (const std::string& each : declarations) {
+    NSXMLParseError error;
+    const auto document = NSXMLDocument::documentWithData(withSubset(each), 0, &error);
+    ASSERT_TRUE(document) << each << ": " << error.message;
+    EXPECT_EQ(document->stringValue()->utf8(), "text") << each;
+  }
+  NSXMLParseError error;
+  EXPECT_TRUE(NSXMLDocument::documentWithData(withAll(), 0, &error)) << error.message;
+}
+
+TEST(XMLDeclarations, EveryBreachIsAnErrorWithItsPlace) {
+  for (const std::string& each : unsound) {
+    NSXMLParseError error;
+    EXPECT_FALSE(NSXMLDocument::documentWithData(withSubset(each), 0, &error)) << each;
+    EXPECT_FALSE(error.message.empty()) << each;
+    EXPECT_EQ(error.line, 1) << each;
+  }
+}
+
+TEST(XMLDeclarations, TheyMayBeCutAnywhere) {
+  std::vector<std::string> documents = {withAll()};
+  for (const std::string& each : declarations) documents.push_back(withSubset(each));
+  for (const std::string& each : unsound) documents.push_back(withSubset(each));
+  for (const std::string& text : documents) {
+    for (size_t length = 0; length < text.size(); ++length) {
+      NSXMLParseError error;
+      EXPECT_FALSE(
+          NSXMLDocument::documentWithData(std::string_view(text).substr(0, length), 0, &error))
+          << text.substr(0, length);
+      EXPECT_FALSE(error.message.empty());
+    }
+  }
+}
+
+class Ignorant final : public LibXMLHandler {
+ public:
+  void startElement(const LibXMLName&, const LibXMLNamespaces&, const LibXMLAttributes&) override {}
+  void endElement() override {}
+  void characters(std::string_view) override {}
+  void CDATA(std::string_view) override {}
+  void comment(std::string_view) override {}
+  void processingInstruction(LibXMLText, std::string_view) override {}
+};
+
+// A failing reader gives the text up to a place and then fails in its way.
+template <class Fail>
+void readUpTo(const std::string& text, size_t place, Fail fail) {
+  size_t at = 0;
+  const LibXMLReader read = [&](char* buffer, size_t size) -> ptrdiff_t {
+    if (at == place) return fail();
+    const size_t count = std::min(size, place - at);
+    text.copy(buffer, count, at);
+    at += count;
+    return static_cast<ptrdiff_t>(count);
+  };
+  Ignorant handler;
+  NSXMLParseError error;
+  EXPECT_FALSE(parseWithLibXML(read, handler, error));
+}
+
+TEST(XMLDeclarations, TheInputMayFailAnywhere) {
+  const std::string text = withAll();
+  for (size_t place = 0; place < text.size(); ++place) {
+    readUpTo(text, place, []() -> ptrdiff_t { return -1; });
+    readUpTo(text, place, []() -> ptrdiff_t { throw std::bad_alloc(); });
+    EXPECT_THROW(readUpTo(text, place, []() -> ptrdiff_t { throw Ended(); }), Ended);
+  }
+}
+
+TEST(XMLDeclarations, ReadingMayBeEndedAtEveryLook) {
+  // Longer than a block, so that the end comes inside declarations as well.
+  std::string subset;
+  while (subset.size() < 20000) {
+    for (const std::string& each : declarations) subset += each;
+  }
+  const std::string text = withSubset(subset);
+  bool isRead = false;
+  int looks = 0;
+  for (; !isRead; ++looks) {
+    ASSERT_LT(looks, 100000);
+    const LookCounter counter(looks);
+    try {
+      isRead = bool(NSXMLDocument::documentWithData(text, 0));
+      EXPECT_TRUE(isRead);
+      break;
+    } catch (const Ended&) {
+    }
+  }
+  EXPECT_GT(looks, 4);
+}
+
+TEST(XMLDeclarations, WhatIsReportedStaysInside) {
+  // Failures of encodings are reported to whatever the thread has set; a host's settings come back.
+  int heard = 0;
+  const auto hear = [](void* count, xmlError*) { ++*static_cast<int*>(count); };
+  xmlSetStructuredErrorFunc(&heard, hear);
+  testing::internal::CaptureStderr();
+  for (const std::string_view text :
+       {"<?xml version='1.0' encoding='UTF-16'?><a/>", "\xFF\xFE<\0a\0>\0\0\xD8\0\xD8<\0",
+        "<?xml version='1.0' encoding='EUC-JP'?><a>\xFF\xFF\xFF</a>",
+        "<!DOCTYPE a [<!ENTITY lt 'no'>]><a/>"}) {
+    static_cast<void>(NSXMLDocument::documentWithData(text, 0));
+  }
+  EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+  EXPECT_EQ(heard, 0);
+  EXPECT_EQ(xmlStructuredErrorContext, &heard);
+  xmlSetStructuredErrorFunc(nullptr, nullptr);
+}
+
+TEST(XMLDeclarations, TextThatItsEncodingDoesNotKnowIsAnError) {
+  NSXMLParseError error;
+  EXPECT_FALSE(NSXMLDocument::documentWithData(
+      "<?xml version='1.0' encoding='EUC-JP'?><a>\xFF\xFF\xFF</a>", 0, &error));
+  EXPECT_NE(error.message.find("input conversion failed"), std::string::npos) << error.message;
+}
+
+}  // namespace
+}  // namespace xquery
