@@ -31,6 +31,7 @@ const Row rows[] = {
     row(XQueryErrors::tooManyDigits, 0, "limit: number of too many digits"),
     row(XQueryErrors::rangeTooLong, 0, "limit: range of too many items"),
     row(XQueryErrors::unresolvedQName, 1, "can't resolve QName for \"%@\""),
+    row(XQueryErrors::noSource, 3, "there is no query text"),
     row(XQueryErrors::notUTF8, 3, "the query is not well-formed UTF-8"),
     row(XQueryErrors::scannerError, 3, "%@ - %@"),
     row(XQueryErrors::invalidToken, 3, "%@ invalid token (%@)- %@"),

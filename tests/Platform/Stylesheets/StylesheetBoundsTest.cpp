@@ -58,7 +58,12 @@ const Row rows[] = {
        return stylesheet(repeated("<xsl:param name='" + std::string(1000, 'v') + "#'/>", n));
      },
      900, 1100},
-    {"Namespaces", [](int n) { return root("<a/>", repeated("xmlns:p#='u#' ", n)); }, 5000, 7000},
+    {"Namespaces",
+     [](int n) {
+       return root("<a " + repeated("xmlns:q#='v#' ", n - n / 2) + "/>",
+                   repeated("xmlns:p#='u#' ", n / 2));
+     },
+     5000, 7000},
     {"NestedNamespaces",
      [](int n) {
        return root(repeated("<a xmlns:p#='" + std::string(1000, 'u') + "'>", n) +
