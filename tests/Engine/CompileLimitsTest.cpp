@@ -81,7 +81,7 @@ class LongCompilation : public testing::TestWithParam<LongText> {};
 
 // The text is so long that compiling it takes longer than the time that it gets.
 TEST_P(LongCompilation, EndsAtItsDeadline) {
-  const auto text = NSString::stringWithUTF8(GetParam().text(24 * MiB));
+  const auto text = NSString::stringWithUTF8(GetParam().text(16 * MiB));
   XQueryLimits limits;
   limits.duration = milliseconds(5);
   const auto attempt = [&] {
@@ -101,7 +101,7 @@ TEST_P(LongCompilation, EndsAtItsDeadline) {
 
 // One that fails does so as often as the evaluation is not ended.
 TEST_P(LongCompilation, EndsWithTheEvaluationThatItIsPartOf) {
-  const std::string text = GetParam().text(8 * MiB);
+  const std::string text = GetParam().text(4 * MiB);
   const Value item = NSString::stringWithUTF8(text);
   const auto query =
       XQuery::xqueryWithSource("declare variable $text external; (1 to 1000)[ext:eval($text)]");
@@ -175,9 +175,9 @@ TEST(CompileLimits, DoNotHoldForTheEvaluation) {
 
 TEST(CompileLimits, CountTheMemoryOfCompiling) {
   XQueryLimits limits;
-  limits.memoryCeiling = 16 * MiB;
+  limits.memoryCeiling = 4 * MiB;
   for (const LongText& row : longTexts) {
-    EXPECT_EQ(failureWithin(limits, row.text(12 * MiB)), "0 limit: memory ceiling reached")
+    EXPECT_EQ(failureWithin(limits, row.text(3 * MiB)), "0 limit: memory ceiling reached")
         << row.name;
   }
 }
@@ -240,7 +240,7 @@ TEST(CompileLimits, OfAnInnerQueryAreThoseOfTheEvaluationAroundIt) {
             "invalid arguments to function - ext:eval");
   EXPECT_EQ(ceilingOn(std::string(8 * MiB, '\n') + "#", 12 * MiB), "limit: memory ceiling reached");
   EXPECT_EQ(ceilingOn(std::string(8 * MiB, '\n') + "1", 12 * MiB), "limit: memory ceiling reached");
-  EXPECT_EQ(ceilingOn("1" + repeated(",1", 2 * MiB), 32 * MiB), "limit: memory ceiling reached");
+  EXPECT_EQ(ceilingOn("1" + repeated(",1", MiB / 4), 4 * MiB), "limit: memory ceiling reached");
 }
 
 // --- no source -----------------------------------------------------------------------------------
