@@ -90,8 +90,11 @@ void replaceAll(std::string& text, const std::string& what, const std::string& w
   }
 }
 
-xquery::Ref<xquery::XQuery> compile(const std::string& text, const Setting& setting) {
-  return xquery::XQuery::xqueryWithSource(std::string_view(text), setting.loading);
+xquery::Ref<xquery::XQuery> compile(const LimitRow& row, const std::string& text,
+                                    const Setting& setting) {
+  const xquery::XQueryLimits none;
+  return xquery::XQuery::xqueryWithSource(std::string_view(text), setting.loading,
+                                          row.door == Door::Compile ? setting.limits : none);
 }
 
 std::string firstError(const xquery::XQuery& query) {
@@ -105,7 +108,7 @@ std::string runOnce(const LimitRow& row, const std::string& query, const Setting
                     const xquery::Value& item, Clock::time_point& start) {
   startPeak();
   start = Clock::now();
-  const auto compiled = compile(query, setting);
+  const auto compiled = compile(row, query, setting);
   std::string error = firstError(*compiled);
   if (row.door == Door::Compile || !error.empty()) return error;
   const auto context = xquery::XQueryContext::xqueryContext();
