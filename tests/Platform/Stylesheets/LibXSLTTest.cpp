@@ -4,6 +4,7 @@
 #include "Platform/Stylesheets/LibXSLT.h"
 #include "Platform/Stylesheets/StylesheetTestSupport.h"
 
+#include <algorithm>
 #include <chrono>
 #include <cstdlib>
 #include <string>
@@ -164,10 +165,14 @@ TEST(LibXSLTDeathTest, TheProcessEndsAtOnceWhileOneIsLeftBehind) {
     }
     std::exit(1);
   };
-  // To wait for it would take minutes.
-  const auto begin = std::chrono::steady_clock::now();
-  EXPECT_EXIT(leaveAndEnd(), testing::ExitedWithCode(0), "^$");
-  EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(8));
+  // To wait for it would take minutes. A busy machine can lengthen an attempt.
+  auto least = std::chrono::steady_clock::duration::max();
+  for (int times = 0; times < 5 && least > std::chrono::seconds(8); ++times) {
+    const auto begin = std::chrono::steady_clock::now();
+    EXPECT_EXIT(leaveAndEnd(), testing::ExitedWithCode(0), "^$");
+    least = std::min(least, std::chrono::steady_clock::now() - begin);
+  }
+  EXPECT_LT(least, std::chrono::seconds(8));
 }
 
 TEST(LibXSLT, WaitsForItsTurnWhileManyAreLeftBehind) {
