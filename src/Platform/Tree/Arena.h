@@ -270,7 +270,7 @@ class NSXMLTree : public NSXMLTreeHead {
   static constexpr uintptr_t tagBits = 3;
   uintptr_t _extra = 0;
   NSXMLBaseURI* _baseURIs = nullptr;
-  bool _baseURIsAreAlike = true;  // of one owner, with one URI
+  bool _baseURIsAreAlike = true;        // of one owner, with one URI
   uint64_t _era = NSXMLEra::current();  // in which it was made; of merged trees the older one's
 };
 
