@@ -1,5 +1,6 @@
 #include "Options.h"
 
+#include "Messages.h"
 #include "Output.h"
 #include "Streams.h"
 
@@ -117,7 +118,7 @@ std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
   } catch (const CLI::Success& success) {
     return print(app, success);
   } catch (const CLI::ParseError& error) {
-    writeMessage("xquery: " + std::string(error.what()) + "\nTry xquery --help.\n");
+    writeMessage("xquery: " + visible(error.what()) + "\nTry xquery --help.\n");
     return StatusUsage;
   }
   return std::nullopt;

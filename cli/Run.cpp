@@ -1,5 +1,6 @@
 #include "Run.h"
 
+#include "Messages.h"
 #include "Output.h"
 #include "Streams.h"
 #include "Timing.h"
@@ -22,7 +23,7 @@ struct Stop {
 };
 
 [[noreturn]] void stop(Status status, const std::string& message) {
-  writeMessage(message + "\n");
+  writeMessage(visible(message) + "\n");
   throw Stop{status};
 }
 
@@ -93,12 +94,7 @@ Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
   Ref<XQuery> query = XQuery::xqueryWithSource(source, loading);
   const Ref<NSArray> errors = query->parseErrors();
   if (!errors || errors->count() == 0) return query;
-  std::string text;
-  for (const Value& error : errors->objects()) {
-    if (!text.empty()) text += '\n';
-    text += cast<NSError>(error)->description()->utf8();
-  }
-  stop(StatusQueryError, text);
+  stop(StatusQueryError, descriptions(*errors));
 }
 
 // Null for a query that has no value and no error, such as a library module. A value that is an
@@ -108,7 +104,7 @@ Ref<NSArray> evaluate(XQueryContext& context, const XQuery& query, const XQueryC
   Ref<XQueryError> error;
   Ref<NSArray> items = context.evaluateXQuery(query, constants, contextItem, &error);
   if (const Ref<NSError> failure = XQueryFirstError(items, error)) {
-    stop(StatusQueryError, failure->description()->utf8());
+    stop(StatusQueryError, description(*failure));
   }
   return items;
 }
@@ -183,7 +179,7 @@ Status run(const Options& options) {
   } catch (const Stop& end) {
     return end.status;
   } catch (const std::exception& error) {
-    writeMessage("xquery: " + std::string(error.what()) + "\n");
+    writeMessage("xquery: " + visible(error.what()) + "\n");
     return StatusInput;
   }
 }

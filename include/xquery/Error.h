@@ -70,6 +70,11 @@ class XQUERY_EXPORT XQueryError : public NSError {
                                               int64_t atLine);
   [[nodiscard]] static Ref<XQueryError> error(int64_t number, std::string_view withMsg);
 
+  // With a message that ends with a line of the query's text; the column counts from 0 as well.
+  [[nodiscard]] static Ref<XQueryError> error(int64_t number, const Ref<NSString>& withMsg,
+                                              int64_t atLine, Ref<NSString> sourceLine,
+                                              int64_t inColumn);
+
   // The same error, known to be one of the module at that URL.
   [[nodiscard]] static Ref<XQueryError> errorInModule(const XQueryError& error,
                                                       Ref<NSString> moduleURL);
@@ -79,6 +84,10 @@ class XQUERY_EXPORT XQueryError : public NSError {
   // May be null.
   const Ref<NSString>& msg() const { return _msg; }
   int64_t line() const { return _line; }
+  // The line of the query's text that the message ends with, as the errors of a parse do, and the
+  // place in it, in characters counted from 1. For any other message null and 0.
+  const Ref<NSString>& sourceLine() const { return _sourceLine; }
+  int64_t column() const { return _column; }
   // Null for an error of the query itself, and for one that arises while it is evaluated.
   const Ref<NSString>& moduleURL() const { return _moduleURL; }
 
@@ -88,7 +97,8 @@ class XQUERY_EXPORT XQueryError : public NSError {
   Ref<NSString> localizedDescription() const override;
 
  protected:
-  XQueryError(int64_t number, Ref<NSString> msg, int64_t line);
+  XQueryError(int64_t number, Ref<NSString> msg, int64_t line, Ref<NSString> sourceLine = nullptr,
+              int64_t column = 0);
   XQueryError(const XQueryError& error, Ref<NSString> moduleURL);
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
@@ -97,6 +107,8 @@ class XQUERY_EXPORT XQueryError : public NSError {
   int64_t _err;
   Ref<NSString> _msg;
   int64_t _line;
+  Ref<NSString> _sourceLine;
+  int64_t _column;
   Ref<NSString> _moduleURL;
 };
 

@@ -151,13 +151,22 @@ int XQueryScanner::finishToken(const XQueryTokenValue& record) {
   return record.token;
 }
 
-int XQueryScanner::errorToken(const std::string& message, int line) {
+int XQueryScanner::errorToken(const std::string& message, int line, size_t place) {
   // The message names the line, so the counter stands there while it is recorded.
   const int currentLine = _line;
   _line = line;
+  _errorPlace = place;
   SetTokenValues(kTokenError, line, XQueryParserSting(message), tokenText());
+  _errorPlace.reset();
   _line = currentLine;
   return kTokenError;
+}
+
+int64_t XQueryScanner::column() const {
+  const std::string_view before(_input, _errorPlace ? *_errorPlace : tokenPlace());
+  const std::string_view inLine = before.substr(before.rfind('\n') + 1);
+  return std::count_if(inLine.begin(), inLine.end(),
+                       [](char byte) { return (static_cast<unsigned char>(byte) & 0xC0) != 0x80; });
 }
 
 void XQueryScanner::noteLiteralSource() {
@@ -185,6 +194,7 @@ void XQueryScanner::XQScannerStringLiteralStart(int tokenCode) {
   _stringLiteralSource.clear();
   _stringLiteralToken = tokenCode;
   _stringLiteralLine = _line;
+  _stringLiteralPlace = tokenPlace();
 }
 
 int XQueryScanner::symbol(int token) {
@@ -244,24 +254,24 @@ int XQueryScanner::invalidToken() {
     default:
       break;
   }
-  return errorToken(message, _line);
+  return errorToken(message, _line, tokenPlace());
 }
 
 int XQueryScanner::endOfInput() {
   _isAtEnd = true;
   switch (_state) {
     case XQueryStateEXPR_COMMENT:
-      return errorToken("comment not terminated ", _commentLine);
+      return errorToken("comment not terminated ", _commentLine, _commentPlace);
     case XQueryStateEXT_CONTENT:
-      return errorToken("extension not terminated ", _commentLine);
+      return errorToken("extension not terminated ", _commentLine, _commentPlace);
     case XQueryStateEXT_KEY:
     case XQueryStateEXT_NAME:
     case XQueryStatePRAG_NAME:
     case XQueryStatePRAG_CONTENT:
-      return errorToken("pragma not terminated ", _commentLine);
+      return errorToken("pragma not terminated ", _commentLine, _commentPlace);
     case XQueryStateSTRING_LITERAL_QUOTE:
     case XQueryStateSTRING_LITERAL_APOS:
-      return errorToken("String not terminated ", _stringLiteralLine);
+      return errorToken("String not terminated ", _stringLiteralLine, _stringLiteralPlace);
     default:
       return SetTokenValues(0, _line, nullptr, {});
   }
@@ -299,6 +309,7 @@ int XQueryScanner::literalClose() {
 
 void XQueryScanner::commentOpen(int state) {
   _commentLine = _line;
+  _commentPlace = tokenPlace();
   XQScanStatePush(_state);
   XQScanStateSet(state);
 }

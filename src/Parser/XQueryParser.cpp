@@ -36,10 +36,6 @@ constexpr SetterError setterErrors[] = {
     {XQuerySetterInheritNamespaces, XQueryErrors::secondInheritNamespaces},
 };
 
-int currentLine() {
-  return sXQueryParserCurrent->scanner().line();
-}
-
 void logText(const Ref<NSString>& text) {
   if (XQueryLogEnabled()) NSLog(text->utf8());
 }
@@ -50,16 +46,15 @@ void record(const Ref<XQueryError>& error) {
   logText(error->msg());
 }
 
-// At the current line; the text comes first in the log, then the error.
+// At the current line, which the text ends with; the text comes first in the log, then the error.
 template <size_t places, class... Parts>
 void logAndRecord(const XQueryErrorText<places>& row, const Parts&... parts) {
-  const Ref<NSString> text = row.message(parts...);
+  const XQueryScanner& scanner = sXQueryParserCurrent->scanner();
+  const Ref<NSString> sourceLine = sXQueryParserCurrent->sourceLine(scanner.line());
+  const Ref<NSString> text = row.message(parts..., sourceLine);
   logText(text);
-  sXQueryParserCurrent->setError(XQueryError::error(row.number, text, currentLine()));
-}
-
-Ref<NSString> currentSourceLine() {
-  return sXQueryParserCurrent->sourceLine(currentLine());
+  sXQueryParserCurrent->setError(
+      XQueryError::error(row.number, text, scanner.line(), sourceLine, scanner.column()));
 }
 
 // A carriage return, with the line feed behind it if there is one, is one line feed.
@@ -214,12 +209,11 @@ void* XQueryParserAllocate(size_t size) {
 }
 
 void XQerror(const char* message) {
-  logAndRecord(XQueryErrors::invalidToken, message, sXQueryParserCurrent->scanner().tokenText(),
-               currentSourceLine());
+  logAndRecord(XQueryErrors::invalidToken, message, sXQueryParserCurrent->scanner().tokenText());
 }
 
 void XQueryParseError(std::string_view message) {
-  logAndRecord(XQueryErrors::scannerError, message, currentSourceLine());
+  logAndRecord(XQueryErrors::scannerError, message);
 }
 
 void XQueryFatalError(const char* message) {

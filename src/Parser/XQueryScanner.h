@@ -13,6 +13,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -67,6 +68,9 @@ class XQueryScanner {
 
   // The current line, counted from 0.
   int line() const { return _line; }
+  // Characters before the current token in its line; a token of several lines counts as beginning
+  // with the last of them. For an error, those before what it is about.
+  int64_t column() const;
   // The text of the current token; empty at the end of the input.
   std::string_view tokenText() const;
   // Whether it came upon what is no token.
@@ -119,7 +123,8 @@ class XQueryScanner {
   int finishWord(const XQueryScannedWord& word);
 
   int finishToken(const XQueryTokenValue& record);
-  int errorToken(const std::string& message, int line);
+  int errorToken(const std::string& message, int line, size_t place);
+  size_t tokenPlace() const;
   void noteLiteralSource();
   void enterState(int state);
   void resetActions();
@@ -131,6 +136,8 @@ class XQueryScanner {
   size_t _inputBytes = 0;  // what the input takes, with its end marks
   XQueryTokenValue* _value = nullptr;
   int _line = 0;
+  // Places count in bytes from the start of the input.
+  std::optional<size_t> _errorPlace;  // while an error is recorded
   int _state = XQueryStateINITIAL;
   int _startState = XQueryStateDEFAULT;
   std::vector<uint8_t> _stateStack;
@@ -140,9 +147,11 @@ class XQueryScanner {
   NSMutableString _stringLiteral;
   int _stringLiteralToken = 0;
   int _stringLiteralLine = 0;
+  size_t _stringLiteralPlace = 0;
   std::string _stringLiteralSource;  // only while token sources are logged
   // Lines of the last "(:" and of the last "pragma" or "extension".
   int _commentLine = 0;
+  size_t _commentPlace = 0;
   int _extensionLine = 0;
   Ref<NSString> _extensionName;
   NSMutableString _extensionContent;

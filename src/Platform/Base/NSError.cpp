@@ -47,11 +47,14 @@ Ref<NSString> NSError::localizedDescription() const {
   return text.string();
 }
 
-XQueryError::XQueryError(int64_t number, Ref<NSString> msg, int64_t line)
+XQueryError::XQueryError(int64_t number, Ref<NSString> msg, int64_t line, Ref<NSString> sourceLine,
+                         int64_t column)
     : NSError(Kind::QueryError, errorDomain(), number, userInfoFor(msg, line)),
       _err(number),
       _msg(std::move(msg)),
-      _line(line) {
+      _line(line),
+      _sourceLine(std::move(sourceLine)),
+      _column(column) {
   if (XQueryLogEnabled()) NSLog(XQueryError::localizedDescription()->utf8());
 }
 
@@ -61,6 +64,8 @@ XQueryError::XQueryError(const XQueryError& error, Ref<NSString> moduleURL)
       _err(error.err()),
       _msg(error.msg()),
       _line(error.line()),
+      _sourceLine(error.sourceLine()),
+      _column(error.column()),
       _moduleURL(std::move(moduleURL)) {}
 
 Ref<XQueryError> XQueryError::errorInModule(const XQueryError& error, Ref<NSString> moduleURL) {
@@ -81,6 +86,11 @@ Ref<XQueryError> XQueryError::error(int64_t number, std::string_view withMsg, in
 
 Ref<XQueryError> XQueryError::error(int64_t number, std::string_view withMsg) {
   return error(number, NSString::stringWithUTF8Replacing(withMsg));
+}
+
+Ref<XQueryError> XQueryError::error(int64_t number, const Ref<NSString>& withMsg, int64_t atLine,
+                                    Ref<NSString> sourceLine, int64_t inColumn) {
+  return make<XQueryError>(number, withMsg, atLine + 1, std::move(sourceLine), inColumn + 1);
 }
 
 Ref<NSString> XQueryError::localizedDescription() const {
