@@ -3,6 +3,7 @@
 #include "Messages.h"
 #include "Output.h"
 #include "Streams.h"
+#include "xquery/xquery.h"
 
 #include <CLI/CLI.hpp>
 
@@ -29,19 +30,26 @@ class Help : public CLI::Formatter {
   }
 };
 
+// Whether a value is for the query to see or a path, which may be any bytes.
+enum class Bound { Text, File };
+
 // Splits NAME=VALUE at the first "="; the name must not be empty.
-Binding splitBinding(const std::string& option, const std::string& text) {
+Binding splitBinding(const std::string& option, const std::string& text, Bound bound) {
   const size_t equals = text.find('=');
   if (equals == std::string::npos || equals == 0) {
     throw CLI::ValidationError(option, "expected a name, \"=\" and a value, not \"" + text + "\"");
   }
+  // The library would pass over a name or a value that it cannot read.
+  if (!xquery::NSString::stringWithUTF8(bound == Bound::Text ? text : text.substr(0, equals))) {
+    throw CLI::ValidationError(option, "not UTF-8 text: \"" + text + "\"");
+  }
   return {text.substr(0, equals), text.substr(equals + 1)};
 }
 
-std::vector<Binding> splitBindings(const std::string& option,
-                                   const std::vector<std::string>& texts) {
+std::vector<Binding> splitBindings(const std::string& option, const std::vector<std::string>& texts,
+                                   Bound bound) {
   std::vector<Binding> bindings;
-  for (const std::string& text : texts) bindings.push_back(splitBinding(option, text));
+  for (const std::string& text : texts) bindings.push_back(splitBinding(option, text, bound));
   return bindings;
 }
 
@@ -87,9 +95,9 @@ void interpret(const CLI::App& app, const RawOptions& raw, Options& options) {
     if (hasSecond) options.input = raw.second;
   }
   if (app.count("-o") > 0) options.outputFile = raw.output;
-  options.variables = splitBindings("--var", raw.variables);
-  options.documents = splitBindings("--doc", raw.documents);
-  for (Binding& binding : splitBindings("--namespace", raw.namespaces)) {
+  options.variables = splitBindings("--var", raw.variables, Bound::Text);
+  options.documents = splitBindings("--doc", raw.documents, Bound::File);
+  for (Binding& binding : splitBindings("--namespace", raw.namespaces, Bound::Text)) {
     options.namespaces[binding.name] = binding.value;
   }
 }

@@ -76,9 +76,7 @@ Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path,
 XQueryConstants bindConstants(const Options& options) {
   XQueryConstants constants;
   for (const Binding& binding : options.variables) {
-    const Value value = XQueryUntypedAtomic(binding.value);
-    if (!value) stop(StatusUsage, "xquery: --var " + binding.name + ": not UTF-8 text");
-    constants[binding.name] = value;
+    constants[binding.name] = XQueryUntypedAtomic(binding.value);
   }
   for (const Binding& binding : options.documents) {
     constants[binding.name] = readDocument(options, binding.value, Markup::XML);

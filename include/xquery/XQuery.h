@@ -105,8 +105,7 @@ class XQUERY_EXPORT XQueryClient {
 // The object against which queries are evaluated. It keeps, from one evaluation to the next:
 //   - what the host gave it: client, namespaces, loading settings, limits
 //   - the context item, which stays in force for an evaluation that is given none
-//   - the clock: current-dateTime and its kin answer the moment at which the context was first
-//   asked
+//   - the clock: current-dateTime and its kin answer the moment when the context was first asked
 //   - the documents that fn:doc loaded, and which URLs gave none: neither is fetched again
 //   - the base URIs recorded for constructed nodes, and its last error
 //

@@ -5,6 +5,8 @@
 
 #include <ostream>
 #include <string>
+#include <sys/stat.h>
+#include <unistd.h>
 #include <vector>
 
 using command::books;
@@ -90,21 +92,35 @@ TEST_P(Usage, IsTwoWithAnExplanation) {
 
 INSTANTIATE_TEST_SUITE_P(
     Wrong, Usage,
-    testing::Values(WrongUsage{"UnknownOption", {"--bogus", "-e", "1"}, "--bogus"},
-                    WrongUsage{"NoQuery", {}, "QUERYFILE"},
-                    WrongUsage{"TooManyArguments", {"a.xq", "b.xml", "c"}, "c"},
-                    WrongUsage{"TooManyArgumentsWithText", {"-e", "1", "b.xml", "c"}, "c"},
-                    WrongUsage{"TextWithoutText", {"-e"}, "-e"},
-                    WrongUsage{"TextTwice", {"-e", "1", "-e", "2"}, "-e"},
-                    WrongUsage{"VariableWithoutValue", {"--var", "x", "-e", "1"}, "--var"},
-                    WrongUsage{"VariableWithoutName", {"--var", "=x", "-e", "1"}, "--var"},
-                    WrongUsage{"DocumentWithoutFile", {"--doc", "d", "-e", "1"}, "--doc"},
-                    WrongUsage{
-                        "NamespaceWithoutURI", {"--namespace", "p", "-e", "1"}, "--namespace"},
-                    WrongUsage{"VariableNotUTF8", {"--var", "x=\xff", "-e", "1"}, "not UTF-8"},
-                    WrongUsage{"RepeatZero", {"--repeat", "0", "-e", "1"}, "--repeat"},
-                    WrongUsage{"RepeatNegative", {"--repeat", "-3", "-e", "1"}, "--repeat"},
-                    WrongUsage{"RepeatNoNumber", {"--repeat", "often", "-e", "1"}, "--repeat"}),
+    testing::Values(
+        WrongUsage{"UnknownOption", {"--bogus", "-e", "1"}, "--bogus"},
+        WrongUsage{"NoQuery", {}, "QUERYFILE"},
+        WrongUsage{"TooManyArguments", {"a.xq", "b.xml", "c"}, "c"},
+        WrongUsage{"TooManyArgumentsWithText", {"-e", "1", "b.xml", "c"}, "c"},
+        WrongUsage{"TextWithoutText", {"-e"}, "-e"},
+        WrongUsage{"TextTwice", {"-e", "1", "-e", "2"}, "-e"},
+        WrongUsage{"VariableWithoutValue", {"--var", "x", "-e", "1"}, "--var"},
+        WrongUsage{"VariableWithoutName", {"--var", "=x", "-e", "1"}, "--var"},
+        WrongUsage{"DocumentWithoutFile", {"--doc", "d", "-e", "1"}, "--doc"},
+        WrongUsage{"NamespaceWithoutURI", {"--namespace", "p", "-e", "1"}, "--namespace"},
+        WrongUsage{"VariableNotUTF8", {"--var", "x=\xff", "-e", "1"}, "not UTF-8"},
+        WrongUsage{"VariableNameNotUTF8", {"--var", "\xff=x", "-e", "1"}, "--var: not UTF-8"},
+        WrongUsage{"DocumentNameNotUTF8", {"--doc", "\xff=x", "-e", "1"}, "--doc: not UTF-8"},
+        WrongUsage{
+            "NamespaceNotUTF8", {"--namespace", "p=\xff", "-e", "1"}, "--namespace: not UTF-8"},
+        WrongUsage{"NamespaceWithoutPrefix", {"--namespace", "=urn:x", "-e", "1"}, "--namespace"},
+        WrongUsage{"OptionsWithoutValues", {"-e", "1", "-o"}, "-o"},
+        WrongUsage{"VariableWithoutAnything", {"-e", "1", "--var"}, "--var"},
+        WrongUsage{"FlagWithValue", {"-e", "1", "--types=x"}, "--types"},
+        WrongUsage{"OutputTwice", {"-e", "1", "-o", "a", "-o", "b"}, "-o"},
+        WrongUsage{"RepeatTwice", {"-e", "1", "--repeat", "1", "--repeat", "2"}, "--repeat"},
+        WrongUsage{"RepeatTooOften", {"--repeat", "1000000001", "-e", "1"}, "--repeat"},
+        WrongUsage{
+            "RepeatBeyondNumbers", {"--repeat", "99999999999999999999999", "-e", "1"}, "--repeat"},
+        WrongUsage{"RepeatEmpty", {"--repeat", "", "-e", "1"}, "--repeat"},
+        WrongUsage{"RepeatZero", {"--repeat", "0", "-e", "1"}, "--repeat"},
+        WrongUsage{"RepeatNegative", {"--repeat", "-3", "-e", "1"}, "--repeat"},
+        WrongUsage{"RepeatNoNumber", {"--repeat", "often", "-e", "1"}, "--repeat"}),
     [](const auto& parameter) { return parameter.param.name; });
 
 // --- input that cannot be read or parsed ---------------------------------------------------------
@@ -167,6 +183,54 @@ TEST(ExitStatus, ADirectoryAsInputIsThree) {
   const Outcome outcome = xquery({"-e", "1", directory.path("")});
   EXPECT_EQ(outcome.status, 3);
   EXPECT_EQ(outcome.err, "xquery: " + directory.path("") + ": Is a directory\n");
+}
+
+TEST(ExitStatus, ADirectoryAsADocumentForAVariableIsThree) {
+  const TemporaryDirectory directory;
+  const Outcome outcome = xquery({"-e", "1", "--doc", "d=" + directory.path("")});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_EQ(outcome.err, "xquery: " + directory.path("") + ": Is a directory\n");
+}
+
+TEST(ExitStatus, AFileThatMustNotBeReadIsThree) {
+  if (geteuid() == 0) GTEST_SKIP() << "root may read every file";
+  const TemporaryDirectory directory;
+  const std::string file = directory.write("secret", "<a/>");
+  chmod(file.c_str(), 0);
+  for (const std::vector<std::string>& arguments :
+       {std::vector<std::string>{file}, {"-e", "1", file}, {"-e", "1", "--doc", "d=" + file}}) {
+    const Outcome outcome = xquery(arguments);
+    EXPECT_EQ(outcome.status, 3);
+    EXPECT_EQ(outcome.err, "xquery: " + file + ": Permission denied\n");
+  }
+}
+
+TEST(ExitStatus, APathLongerThanTheSystemTakesIsThree) {
+  const std::string path = "/" + std::string(10000, 'x');
+  const std::vector<std::string> commands[] = {
+      {path}, {"-e", "1", path}, {"-e", "1", "--doc", "d=" + path}, {"-e", "1", "-o", path}};
+  for (const auto& arguments : commands) {
+    const Outcome outcome = xquery(arguments);
+    EXPECT_EQ(outcome.status, 3);
+    EXPECT_EQ(outcome.out, "");
+    EXPECT_THAT(outcome.err, HasSubstr("File name too long"));
+  }
+}
+
+TEST(ExitStatus, AnEnormousQueryIsEvaluated) {
+  std::string sum = "1";
+  for (int n = 0; n < 60000; ++n) sum += "+1";
+  EXPECT_EQ(xquery({"-e", sum}).out, "60001\n");
+}
+
+TEST(ExitStatus, PipesMayBeReadAsFiles) {
+  const TemporaryDirectory directory;
+  const Outcome outcome = command::shell(
+      "mkfifo \"$1\" \"$2\"; echo '/a/b' > \"$1\" & echo '<a><b/></a>' > \"$2\" & "
+      "timeout 60 \"$0\" \"$1\" \"$2\"",
+      {directory.path("query"), directory.path("input")});
+  EXPECT_EQ(outcome.err, "");
+  EXPECT_EQ(outcome.out, "<b/>\n");
 }
 
 TEST(ExitStatus, MalformedXMLIsThreeWithFileLineAndColumn) {
