@@ -16,11 +16,13 @@ bool isSame(const struct stat& a, const struct stat& b) {
   return a.st_dev == b.st_dev && a.st_ino == b.st_ino;
 }
 
-// The standard output or error that the file is; -1 for another file.
+// The standard output or error that the file is; -1 for another file, and where the stream only
+// stands for one that was closed.
 int standardStream(const struct stat& file) {
   for (const int stream : {STDOUT_FILENO, STDERR_FILENO}) {
     struct stat status;
-    if (fstat(stream, &status) == 0 && isSame(status, file)) return stream;
+    const bool isWritable = (fcntl(stream, F_GETFL) & O_ACCMODE) != O_RDONLY;
+    if (isWritable && fstat(stream, &status) == 0 && isSame(status, file)) return stream;
   }
   return -1;
 }

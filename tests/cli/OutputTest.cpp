@@ -238,6 +238,7 @@ TEST_F(ResultFile, ThatMustNotBeWrittenStays) {
 
 TEST_F(ResultFile, MayBeADevice) {
   EXPECT_EQ(xquery({"-o", "/dev/null", "-e", "1"}).status, 0);
+  EXPECT_EQ(shell("\"$0\" -o /dev/null -e 1 >&- 2>&-").status, 0);
   EXPECT_TRUE(fs::is_character_file("/dev/null"));
 }
 
