@@ -3,6 +3,7 @@
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryTextArgument.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/Blocks.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
@@ -51,16 +52,18 @@ Value joined(const NSArray& items, NSStringView separator, XQueryContext& contex
 // The same for strings that are 8-bit all of them, whose length is known beforehand.
 Value joinedNarrow(const NSArray& items, NSStringView separator, size_t length) {
   if (length >= NSStringView::notFound) throw std::bad_alloc();
-  std::string text;
+  ValueText<char> text;
   text.reserve(length);
+  const auto append = [&text](NSStringView piece) {
+    appendInBlocks(text, std::string_view(piece.asciiUnits(), piece.length()));
+  };
   WorkPacer pacer;
   for (size_t index = 0; index < items.count(); ++index) {
     pacer.turn();
-    if (index > 0) text.append(separator.asciiUnits(), separator.length());
-    const NSStringView piece = cast<NSString>(items.objects()[index])->view();
-    text.append(piece.asciiUnits(), piece.length());
+    if (index > 0) append(separator);
+    append(cast<NSString>(items.objects()[index])->view());
   }
-  return XQueryString::stringWithView(NSStringView::ascii(text));
+  return XQueryString::stringWithView(viewOf(text));
 }
 
 }  // namespace

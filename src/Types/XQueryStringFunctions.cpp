@@ -12,8 +12,8 @@ namespace {
 
 uint32_t leadingWhiteSpace(NSStringView text) {
   uint32_t count = 0;
-  while (count < text.length() && XQueryIsWhiteSpace(text[count])) ++count;
-  checkUnits(count);
+  WorkPacer pacer;
+  for (; count < text.length() && XQueryIsWhiteSpace(text[count]); ++count) pacer.turn();
   return count;
 }
 
@@ -53,8 +53,8 @@ Ref<NSString> XQueryStringTrimWS(const Ref<NSString>& string) {
   const NSStringView text = string->view();
   const uint32_t from = leadingWhiteSpace(text);
   uint32_t end = text.length();
-  while (end > from && XQueryIsWhiteSpace(text[end - 1])) --end;
-  checkUnits(text.length() - end);
+  WorkPacer pacer;
+  for (; end > from && XQueryIsWhiteSpace(text[end - 1]); --end) pacer.turn();
   if (end - from == text.length()) return string;
   return NSString::stringWithView(text.substring(from, end - from));
 }

@@ -4,10 +4,12 @@
 #include "Platform/Base/WorkMeter.h"
 #include "xquery/String.h"
 
+#include <algorithm>
 #include <cstdint>
 #include <new>
 #include <string>
 #include <string_view>
+#include <type_traits>
 
 namespace xquery {
 
@@ -28,6 +30,34 @@ void inBlocks(std::basic_string_view<Text> text, Work work) {
   work(text);
 }
 
+// Text that counts as memory of values while it is put together.
+template <class Unit>
+using ValueText = std::basic_string<Unit, std::char_traits<Unit>, ValueAllocator<Unit>>;
+
+// Room for more units. A long text that has to move for it moves in blocks.
+template <class Text>
+void makeRoom(Text& text, size_t more) {
+  const size_t needed = text.size() + more;
+  if (needed <= text.capacity() || text.size() <= unitsPerBlock) return;
+  Text larger;
+  larger.reserve(std::max(needed, 2 * text.capacity()));
+  inBlocks(std::basic_string_view<typename Text::value_type>(text),
+           [&larger](auto block) { larger.append(block); });
+  text.swap(larger);
+}
+
+template <class Text, class Unit>
+void appendInBlocks(Text& text, std::basic_string_view<Unit> piece) {
+  makeRoom(text, piece.size());
+  inBlocks(piece, [&text](std::basic_string_view<Unit> block) {
+    if constexpr (std::is_same_v<Unit, typename Text::value_type>) {
+      text.append(block);
+    } else {
+      text.append(block.begin(), block.end());
+    }
+  });
+}
+
 // The units of the text, in the width in which they are stored.
 template <class Work>
 auto withUnitsOf(NSStringView text, Work work) {
@@ -41,8 +71,8 @@ NSStringView viewOf(std::basic_string_view<Unit> text) {
   if (text.size() >= NSStringView::notFound) throw std::bad_alloc();
   return {text.data(), static_cast<uint32_t>(text.size())};
 }
-template <class Unit>
-NSStringView viewOf(const std::basic_string<Unit>& text) {
+template <class Unit, class Allocator>
+NSStringView viewOf(const std::basic_string<Unit, std::char_traits<Unit>, Allocator>& text) {
   return viewOf(std::basic_string_view<Unit>(text));
 }
 

@@ -1,6 +1,7 @@
 #include "Platform/Text/Encoding.h"
 
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/Blocks.h"
 
 #include <unicode/ucnv.h>
 #include <unicode/ucnv_err.h>
@@ -48,7 +49,7 @@ std::optional<std::u16string> decoded(std::string_view bytes, UConverter* conver
     char16_t* target = piece;
     ucnv_toUnicode(converter, &target, piece + std::size(piece), &source, end, nullptr, true,
                    &status);
-    text.append(piece, target);
+    appendInBlocks(text, std::u16string_view(piece, target));
   } while (status == U_BUFFER_OVERFLOW_ERROR);
   if (U_FAILURE(status)) return std::nullopt;
   return text;
@@ -99,7 +100,7 @@ std::optional<std::string> bytesInCharset(NSStringView text, const std::string& 
     char* target = piece;
     ucnv_fromUnicode(converter.get(), &target, piece + std::size(piece), &source, end, nullptr,
                      true, &status);
-    bytes.append(piece, target);
+    appendInBlocks(bytes, std::string_view(piece, target));
   } while (status == U_BUFFER_OVERFLOW_ERROR);
   if (U_FAILURE(status)) return std::nullopt;
   return bytes;

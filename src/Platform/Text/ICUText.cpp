@@ -1,6 +1,8 @@
 #include "Platform/Text/ICUText.h"
 
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/Blocks.h"
+#include "Platform/Text/UTF16.h"
 
 #include <unicode/uchar.h>
 #include <unicode/unorm2.h>
@@ -154,12 +156,13 @@ Neighbours neighboursAt(std::u16string_view text, size_t index) {
   return found;
 }
 
+constexpr size_t pieceLength = 8192;
+constexpr size_t unitsPerStep = 512;  // of converting
+
 // The results of the pieces of a text, which is cut only where `mayCut` says that it makes no
 // difference, so that a long text can be left in the middle.
 template <class MayCut, class Convert>
 std::u16string inPieces(std::u16string_view text, MayCut mayCut, Convert convert) {
-  constexpr size_t pieceLength = 8192;
-  constexpr size_t unitsPerStep = 512;
   std::u16string result;
   while (text.size() > pieceLength) {
     size_t length = pieceLength;
@@ -168,19 +171,13 @@ std::u16string inPieces(std::u16string_view text, MayCut mayCut, Convert convert
       const bool insidePair = U16_IS_LEAD(at.before) && U16_IS_TRAIL(at.after);
       if (!insidePair && mayCut(at)) break;
     }
-    result += convert(text.substr(0, length));
+    appendInBlocks(result, std::u16string_view(convert(text.substr(0, length))));
     text.remove_prefix(length);
     checkWork(length / unitsPerStep);
   }
   if (result.empty()) return convert(text);
-  return result += convert(text);
-}
-
-// Whether a sigma is final depends on the letters around it and around ignorable characters beside
-// it.
-bool endsSearchForFinalSigma(UChar32 point) {
-  constexpr UChar32 sigma = 0x3A3;
-  return point != sigma && !u_hasBinaryProperty(point, UCHAR_CASE_IGNORABLE);
+  appendInBlocks(result, std::u16string_view(convert(text)));
+  return result;
 }
 
 using CaseMapping = int32_t (*)(char16_t*, int32_t, const char16_t*, int32_t, const char*,
@@ -194,6 +191,82 @@ std::u16string caseMapped(std::u16string_view text, CaseMapping mapping) {
       }));
 }
 
+// Whether a sigma is final depends on the first characters before and after it that are not
+// ignorable. Where a text is cut they are told to each piece: by a letter of its own beside the
+// cut, which is taken off the result again. So the text can be cut anywhere, whatever it consists
+// of.
+class CutForLowerCase {
+ public:
+  explicit CutForLowerCase(std::u16string_view text) : _text(text) {}
+
+  std::u16string run() {
+    std::u16string result;
+    result.reserve(_text.size());
+    bool afterLetter = false;
+    for (size_t from = 0; from < _text.size();) {
+      const size_t end = endOfPiece(from);
+      const std::u16string_view piece = _text.substr(from, end - from);
+      std::u16string mapped = lowerCased(piece, afterLetter, isLetterNext(end));
+      appendInBlocks(result, std::u16string_view(mapped));
+      afterLetter = endsInLetter(piece, afterLetter);
+      from = end;
+      checkWork(1 + piece.size() / unitsPerStep);
+    }
+    return result;
+  }
+
+ private:
+  static constexpr char16_t letter = u'a';
+
+  static bool isIgnorable(UChar32 point) {
+    return u_hasBinaryProperty(point, UCHAR_CASE_IGNORABLE) != 0;
+  }
+  static bool isCased(UChar32 point) { return u_hasBinaryProperty(point, UCHAR_CASED) != 0; }
+
+  // Not between the halves of a pair.
+  size_t endOfPiece(size_t from) const {
+    size_t end = std::min(from + pieceLength, _text.size());
+    if (end < _text.size() && U16_IS_LEAD(_text[end - 1]) && U16_IS_TRAIL(_text[end])) ++end;
+    return end;
+  }
+  // Whether the first character from there on that is not ignorable is a letter. It is looked for
+  // once, however many pieces it is away.
+  bool isLetterNext(size_t from) {
+    WorkPacer pacer;
+    for (_next = std::max(_next, from); _next < _text.size();) {
+      pacer.turn();
+      size_t after = _next;
+      UChar32 point = 0;
+      U16_NEXT(_text.data(), after, _text.size(), point);
+      if (!isIgnorable(point)) return isCased(point);
+      _next = after;
+    }
+    return false;
+  }
+  // The same of the last one of a piece; `before` when it has none.
+  static bool endsInLetter(std::u16string_view piece, bool before) {
+    for (size_t at = piece.size(); at > 0;) {
+      UChar32 point = 0;
+      U16_PREV(piece.data(), 0, at, point);
+      if (!isIgnorable(point)) return isCased(point);
+    }
+    return before;
+  }
+  static std::u16string lowerCased(std::u16string_view piece, bool afterLetter, bool beforeLetter) {
+    std::u16string text;
+    if (afterLetter) text += letter;
+    text += piece;
+    if (beforeLetter) text += letter;
+    std::u16string mapped = caseMapped(text, u_strToLower);
+    if (beforeLetter) mapped.pop_back();
+    if (afterLetter) mapped.erase(0, 1);
+    return mapped;
+  }
+
+  std::u16string_view _text;
+  size_t _next = 0;  // what lies between the end of the last piece and here is ignorable
+};
+
 }  // namespace
 
 std::u16string upperCasedText(std::u16string_view text) {
@@ -203,12 +276,7 @@ std::u16string upperCasedText(std::u16string_view text) {
 }
 
 std::u16string lowerCasedText(std::u16string_view text) {
-  return inPieces(
-      text,
-      [](Neighbours at) {
-        return endsSearchForFinalSigma(at.before) && endsSearchForFinalSigma(at.after);
-      },
-      [](std::u16string_view piece) { return caseMapped(piece, u_strToLower); });
+  return text.size() <= pieceLength ? caseMapped(text, u_strToLower) : CutForLowerCase(text).run();
 }
 
 std::u16string normalizedText(std::u16string_view text, NSNormalizationForm form) {
@@ -226,21 +294,30 @@ std::u16string normalizedText(std::u16string_view text, NSNormalizationForm form
 }
 
 std::optional<std::u16string> textWithCodePoints(const std::vector<int32_t>& points) {
-  return converted<std::u16string>(
-      points.size(), [&](char16_t* out, int32_t capacity, UErrorCode* status) {
-        int32_t length = 0;
-        u_strFromUTF32(out, capacity, &length, points.data(), checkedCount(points.size()), status);
-        return length;
-      });
+  std::u16string text;
+  text.reserve(points.size());
+  WorkPacer pacer;
+  for (const int32_t point : points) {
+    pacer.turn();
+    if (point < 0 || point > UCHAR_MAX_VALUE || U_IS_SURROGATE(point)) return std::nullopt;
+    makeRoom(text, 2);
+    appendUTF16(text, static_cast<char32_t>(point));
+  }
+  return text;
 }
 
 std::optional<std::vector<int32_t>> codePointsOfText(std::u16string_view text) {
-  return converted<std::vector<int32_t>>(
-      text.size(), [&](int32_t* out, int32_t capacity, UErrorCode* status) {
-        int32_t length = 0;
-        u_strToUTF32(out, capacity, &length, text.data(), checkedCount(text.size()), status);
-        return length;
-      });
+  std::vector<int32_t> points;
+  points.reserve(text.size());
+  WorkPacer pacer;
+  for (size_t index = 0; index < text.size();) {
+    pacer.turn();
+    UChar32 point = 0;
+    U16_NEXT(text.data(), index, text.size(), point);
+    if (U_IS_SURROGATE(point)) return std::nullopt;
+    points.push_back(point);
+  }
+  return points;
 }
 
 }  // namespace xquery

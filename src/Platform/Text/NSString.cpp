@@ -5,13 +5,17 @@
 //   InTree   in the arena of a tree, which `owner` keeps alive
 //   Shared   in the buffer of another string, which `owner` keeps alive
 //   none     in a buffer of its own
+#include "Platform/Text/Blocks.h"
 #include "Platform/Text/UTF16.h"
 #include "Platform/Text/UTF8.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
 
+#include <algorithm>
 #include <memory>
 #include <new>
+#include <type_traits>
+#include <utility>
 
 namespace xquery {
 
@@ -34,11 +38,13 @@ uint32_t checkedLength(size_t length) {
 }
 
 // False when the text is not well formed and `replacing` is not asked for.
-bool decodeUTF8(std::string_view text, bool replacing, std::u16string& out) {
+bool decodeUTF8(std::string_view text, bool replacing, ValueText<char16_t>& out) {
   out.reserve(text.size());
   const auto* next = reinterpret_cast<const unsigned char*>(text.data());
   const auto* const end = next + text.size();
+  WorkPacer pacer;
   while (next < end) {
+    pacer.turn();
     const char32_t point = readUTF8(next, end);
     if (point != invalidCodePoint) {
       appendUTF16(out, point);
@@ -51,11 +57,60 @@ bool decodeUTF8(std::string_view text, bool replacing, std::u16string& out) {
   return true;
 }
 
+bool isASCIIInBlocks(std::string_view text) {
+  bool narrow = true;
+  inBlocks(text, [&narrow](std::string_view block) { narrow = narrow && isASCII(block); });
+  return narrow;
+}
+
 Ref<NSString> decoded(std::string_view text, bool replacing) {
-  if (isASCII(text)) return NSString::stringWithASCII(text);
-  std::u16string wide;
+  if (isASCIIInBlocks(text)) return NSString::stringWithASCII(text);
+  ValueText<char16_t> wide;
   if (!decodeUTF8(text, replacing, wide)) return nullptr;
   return NSString::stringWithUTF16(wide);
+}
+
+// Memory for units, until somebody keeps it.
+class UnitBlock {
+ public:
+  explicit UnitBlock(size_t bytes) : _units(allocateValueMemory(bytes)), _bytes(bytes) {}
+  ~UnitBlock() {
+    if (_units) freeValueMemory(_units, _bytes);
+  }
+  UnitBlock(const UnitBlock&) = delete;
+  UnitBlock& operator=(const UnitBlock&) = delete;
+  void* units() const { return _units; }
+  void* keep() { return std::exchange(_units, nullptr); }
+
+ private:
+  void* _units;
+  size_t _bytes;
+};
+
+// To memory that has room for the units, in the width that they are given.
+template <class Unit, class TextUnit>
+void copyInBlocks(std::basic_string_view<TextUnit> text, void* to) {
+  auto* out = static_cast<Unit*>(to);
+  inBlocks(text, [&out](std::basic_string_view<TextUnit> block) {
+    if constexpr (std::is_same_v<Unit, TextUnit>) {
+      if (!block.empty()) std::memcpy(out, block.data(), block.size() * sizeof(Unit));
+    } else {
+      std::transform(block.begin(), block.end(), out,
+                     [](TextUnit unit) { return static_cast<Unit>(unit); });
+    }
+    out += block.size();
+  });
+}
+
+// A wide text may be given narrow; the other way there is none.
+void copyUnitsOf(NSStringView text, bool narrow, void* to) {
+  withUnitsOf(text, [&]<class Unit>(std::basic_string_view<Unit> units) {
+    if (narrow) {
+      copyInBlocks<char>(units, to);
+    } else {
+      copyInBlocks<Unit>(units, to);
+    }
+  });
 }
 
 }  // namespace
@@ -106,21 +161,14 @@ void NSString::copyUnits(NSStringView text) {
   const bool narrow = isNarrow(text);
   const size_t bytes = narrow ? _length : size_t{_length} * sizeof(char16_t);
   _flags = narrow ? 0 : Wide;
-  void* units = _inline;
   if (bytes <= inlineBytes) {
     _flags |= Inline;
-  } else {
-    units = allocateValueMemory(bytes);
-    _external = {units, nullptr};
-  }
-  if (_length == 0) return;
-  if (narrow == !text.isWide()) {
-    std::memcpy(units, unitsOf(text), bytes);
+    copyUnitsOf(text, narrow, _inline);
     return;
   }
-  auto* out = static_cast<char*>(units);
-  const char16_t* in = text.wideUnits();
-  for (uint32_t index = 0; index < _length; ++index) out[index] = static_cast<char>(in[index]);
+  UnitBlock block(bytes);
+  copyUnitsOf(text, narrow, block.units());
+  _external = {block.keep(), nullptr};
 }
 
 Ref<NSString> NSString::stringWithUTF8(std::string_view text) {
@@ -161,33 +209,27 @@ const Ref<NSString>& NSString::empty() {
 void NSMutableString::append(NSStringView text) {
   if (text.isEmpty()) return;
   checkedLength(size_t{length()} + text.length());
-  if (!_isWide) {
-    if (!text.isWide()) {
-      _ascii.append(text.asciiUnits(), text.length());
-      return;
+  if (!_isWide && !isNarrow(text)) widen();
+  withUnitsOf(text, [this](auto units) {
+    if (_isWide) {
+      appendInBlocks(_wide, units);
+    } else {
+      appendInBlocks(_ascii, units);
     }
-    if (isNarrow(text)) {
-      _ascii.append(text.wideUnits(), text.wideUnits() + text.length());
-      return;
-    }
-    widen();
-  }
-  if (text.isWide()) {
-    _wide.append(text.wideUnits(), text.length());
-  } else {
-    _wide.append(text.asciiUnits(), text.asciiUnits() + text.length());
-  }
+  });
 }
 
 void NSMutableString::append(char16_t unit) {
   checkedLength(size_t{length()} + 1);
   if (!_isWide) {
     if (unit < 0x80) {
+      makeRoom(_ascii, 1);
       _ascii += static_cast<char>(unit);
       return;
     }
     widen();
   }
+  makeRoom(_wide, 1);
   _wide += unit;
 }
 
@@ -198,11 +240,14 @@ void NSMutableString::appendCodePoint(char32_t point) {
   }
   checkedLength(size_t{length()} + 2);
   if (!_isWide) widen();
+  makeRoom(_wide, 2);
   appendUTF16(_wide, point);
 }
 
 void NSMutableString::widen() {
-  _wide.assign(_ascii.begin(), _ascii.end());
+  _wide.clear();
+  _wide.reserve(_ascii.size());
+  appendInBlocks(_wide, std::string_view(_ascii));
   _ascii.clear();
   _isWide = true;
 }

@@ -29,7 +29,7 @@ auto withUnits(NSStringView text, Function function) {
 }
 
 template <class UnitA, class UnitB>
-bool sameUnits(const UnitA* a, const UnitB* b, uint32_t length) {
+bool sameUnitsOfBlock(const UnitA* a, const UnitB* b, uint32_t length) {
   if constexpr (std::is_same_v<UnitA, UnitB>) {
     return length == 0 || std::memcmp(a, b, size_t{length} * sizeof(UnitA)) == 0;
   } else {
@@ -40,8 +40,30 @@ bool sameUnits(const UnitA* a, const UnitB* b, uint32_t length) {
   }
 }
 
+// Goes through so many units in blocks, between which the work can be ended, until one is
+// `done(from, length)`.
+template <class Work>
+void untilDone(uint32_t length, Work done) {
+  for (uint32_t from = 0; from < length;) {
+    const uint32_t count = std::min(length - from, unitsPerBlock);
+    if (done(from, count)) return;
+    checkUnits(count);
+    from += count;
+  }
+}
+
 template <class UnitA, class UnitB>
-uint32_t firstDifference(const UnitA* a, const UnitB* b, uint32_t length) {
+bool sameUnits(const UnitA* a, const UnitB* b, uint32_t length) {
+  bool same = true;
+  untilDone(length, [&](uint32_t from, uint32_t count) {
+    same = sameUnitsOfBlock(a + from, b + from, count);
+    return !same;
+  });
+  return same;
+}
+
+template <class UnitA, class UnitB>
+uint32_t firstDifferenceInBlock(const UnitA* a, const UnitB* b, uint32_t length) {
   uint32_t index = 0;
   if constexpr (std::is_same_v<UnitA, UnitB>) {
     // Whole words first; the word that differs is looked at unit by unit.
@@ -55,6 +77,16 @@ uint32_t firstDifference(const UnitA* a, const UnitB* b, uint32_t length) {
     }
   }
   while (index < length && widened(a[index]) == widened(b[index])) ++index;
+  return index;
+}
+
+template <class UnitA, class UnitB>
+uint32_t firstDifference(const UnitA* a, const UnitB* b, uint32_t length) {
+  uint32_t index = 0;
+  untilDone(length, [&](uint32_t from, uint32_t count) {
+    index = from + firstDifferenceInBlock(a + from, b + from, count);
+    return index < from + count;
+  });
   return index;
 }
 
@@ -109,7 +141,7 @@ uint32_t findShort(const Unit* text, uint32_t length, const PatternUnit* pattern
     while (from <= last) {
       const uint32_t start = findUnit(text, last + 1, widened(pattern[0]), from);
       if (start == NSStringView::notFound) break;
-      if (sameUnits(text + start, pattern, patternLength)) return start;
+      if (sameUnitsOfBlock(text + start, pattern, patternLength)) return start;
       from = start + 1;
     }
     return NSStringView::notFound;
@@ -150,17 +182,22 @@ uint64_t fourUnits(const char16_t* units) {
 
 template <class Unit>
 uint32_t hashUnits(const Unit* units, uint32_t length) {
+  static_assert(unitsPerBlock % 4 == 0);
   constexpr uint64_t multiplier = 0x9E3779B97F4A7C15ULL;
   uint64_t hash = length * multiplier;
-  uint32_t index = 0;
-  for (; index + 4 <= length; index += 4) {
-    hash = (hash ^ fourUnits(units + index)) * multiplier;
-    hash ^= hash >> 32;
-  }
-  for (; index < length; ++index) {
-    hash = (hash ^ widened(units[index])) * multiplier;
-    hash ^= hash >> 32;
-  }
+  untilDone(length, [&](uint32_t from, uint32_t count) {
+    const uint32_t end = from + count;
+    uint32_t index = from;
+    for (; index + 4 <= end; index += 4) {
+      hash = (hash ^ fourUnits(units + index)) * multiplier;
+      hash ^= hash >> 32;
+    }
+    for (; index < end; ++index) {
+      hash = (hash ^ widened(units[index])) * multiplier;
+      hash ^= hash >> 32;
+    }
+    return false;
+  });
   return static_cast<uint32_t>(hash);
 }
 
@@ -221,7 +258,6 @@ int NSStringView::compare(NSStringView other) const {
   const uint32_t index = withUnits(*this, [&](auto* a) {
     return withUnits(other, [&](auto* b) { return firstDifference(a, b, common); });
   });
-  checkUnits(index);
   if (index == common) {
     return _length == other._length ? 0 : _length < other._length ? -1 : 1;
   }
@@ -236,34 +272,37 @@ int NSStringView::compare(NSStringView other) const {
 
 bool NSStringView::equals(NSStringView other) const {
   if (_length != other._length) return false;
-  checkUnits(_length);
   return withUnits(*this, [&](auto* a) {
     return withUnits(other, [&](auto* b) { return sameUnits(a, b, _length); });
   });
 }
 
 uint32_t NSStringView::hash() const {
-  checkUnits(_length);
   return withUnits(*this, [&](auto* units) { return hashUnits(units, _length); });
 }
 
 void NSStringView::appendUTF8To(std::string& out) const {
-  checkUnits(_length);
   if (!_wide) {
-    out.append(asciiUnits(), _length);
+    appendInBlocks(out, std::string_view(asciiUnits(), _length));
     return;
   }
+  constexpr size_t mostBytesPerUnit = 3;
   const char16_t* units = wideUnits();
-  for (uint32_t index = 0; index < _length; ++index) {
-    const char16_t unit = units[index];
-    if (isHighSurrogate(unit) && index + 1 < _length && isLowSurrogate(units[index + 1])) {
-      appendUTF8(out, codePointAt(*this, index++));
-    } else if (isHighSurrogate(unit) || isLowSurrogate(unit)) {
-      appendUTF8(out, 0xFFFD);
-    } else {
-      appendUTF8(out, unit);
+  uint32_t index = 0;  // past a block whose last unit begins a pair
+  untilDone(_length, [&](uint32_t from, uint32_t count) {
+    makeRoom(out, count * mostBytesPerUnit);
+    for (; index < from + count; ++index) {
+      const char16_t unit = units[index];
+      if (isHighSurrogate(unit) && index + 1 < _length && isLowSurrogate(units[index + 1])) {
+        appendUTF8(out, codePointAt(*this, index++));
+      } else if (isHighSurrogate(unit) || isLowSurrogate(unit)) {
+        appendUTF8(out, 0xFFFD);
+      } else {
+        appendUTF8(out, unit);
+      }
     }
-  }
+    return false;
+  });
 }
 
 std::string NSStringView::utf8() const {
@@ -274,7 +313,10 @@ std::string NSStringView::utf8() const {
 }
 
 std::u16string NSStringView::utf16() const {
-  return withUnits(*this, [&](auto* units) { return std::u16string(units, units + _length); });
+  std::u16string out;
+  out.reserve(_length);
+  withUnitsOf(*this, [&out](auto units) { appendInBlocks(out, units); });
+  return out;
 }
 
 }  // namespace xquery

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/Blocks.h"
 #include "xquery/String.h"
 
 #include <algorithm>
@@ -13,8 +14,17 @@ namespace xquery {
 // Whether 8-bit units can hold the text.
 inline bool isNarrow(NSStringView text) {
   if (!text.isWide()) return true;
-  const std::u16string_view units(text.wideUnits(), text.length());
-  return std::all_of(units.begin(), units.end(), [](char16_t unit) { return unit < 0x80; });
+  std::u16string_view units(text.wideUnits(), text.length());
+  while (!units.empty()) {
+    char16_t bits = 0;
+    for (const char16_t unit : units.substr(0, unitsPerBlock)) {
+      bits = static_cast<char16_t>(bits | unit);
+    }
+    if (bits >= 0x80) return false;
+    checkUnits(static_cast<uint32_t>(std::min<size_t>(units.size(), unitsPerBlock)));
+    units.remove_prefix(std::min<size_t>(units.size(), unitsPerBlock));
+  }
+  return true;
 }
 
 constexpr bool isHighSurrogate(char32_t unit) {

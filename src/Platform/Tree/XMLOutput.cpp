@@ -42,15 +42,17 @@ constexpr XMLEscapes CDATAEscapes() {
 }
 
 void writeNarrow(XMLOutput& out, std::string_view text, const XMLEscapes& escapes) {
-  size_t start = 0;
-  for (size_t at = 0; at < text.size(); ++at) {
-    const char* escape = escapes[static_cast<unsigned char>(text[at])];
-    if (!escape) continue;
-    out.write(text.substr(start, at - start));
-    out.write(std::string_view(escape));
-    start = at + 1;
-  }
-  out.write(text.substr(start));
+  inBlocks(text, [&](std::string_view block) {
+    size_t start = 0;
+    for (size_t at = 0; at < block.size(); ++at) {
+      const char* escape = escapes[static_cast<unsigned char>(block[at])];
+      if (!escape) continue;
+      out.write(block.substr(start, at - start));
+      out.write(std::string_view(escape));
+      start = at + 1;
+    }
+    out.write(block.substr(start));
+  });
 }
 
 // Runs without anything to replace are converted as a whole; so are surrogate pairs within them.
@@ -70,6 +72,7 @@ void writeWide(XMLOutput& out, NSStringView text, const XMLEscapes& escapes) {
     } else if (at - start >= runLength && (unit < 0xDC00 || unit >= 0xE000)) {
       writeRun(at);  // not between the halves of a pair
       start = at;
+      checkWork();
     }
   }
   writeRun(text.length());

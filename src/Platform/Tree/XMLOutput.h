@@ -1,6 +1,7 @@
 // Characters on their way out as XML: gathered as UTF-8, and escaped where XML cannot hold them.
 #pragma once
 
+#include "Platform/Text/Blocks.h"
 #include "xquery/String.h"
 
 #include <array>
@@ -21,7 +22,7 @@ class XMLOutput {
 
   void write(std::string_view bytes) {
     if (!_sink) {
-      _buffer.append(bytes);
+      appendInBlocks(_buffer, bytes);
       return;
     }
     while (!bytes.empty() && !_isStopped) {

@@ -1,8 +1,10 @@
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/ICUText.h"
 #include "xquery/Collection.h"
 #include "xquery/Data.h"
 #include "xquery/Number.h"
 #include "xquery/String.h"
+#include "xquery/URL.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
@@ -138,6 +140,83 @@ TEST(WorkMeter, ALongWayUpATreeIsCharged) {
   Watcher watcher(1000);
   EXPECT_EQ(deepest->level(), 10000);
   EXPECT_EQ(workMeter.stepsLeft, 1000 - 10000 / int{WorkPacer::turnsPerStep});
+}
+
+// --- every pass over a long text can be ended ----------------------------------------------------
+
+constexpr size_t longLength = 1000000;
+
+template <class Work>
+void expectCanBeEnded(const char* name, Work work) {
+  SCOPED_TRACE(name);
+  const int64_t before = workMeter.valueBytes;
+  {
+    Watcher watcher(10, 3);
+    EXPECT_THROW(work(), Ended);
+  }
+  EXPECT_EQ(workMeter.valueBytes, before) << "what was made so far goes";
+}
+
+TEST(WorkMeter, PassesOverALongTextCanBeEnded) {
+  const std::string narrow(longLength, 'x');
+  const std::u16string wide(longLength, u'\u00E9');
+  const std::string encoded = NSString::stringWithUTF16(wide)->utf8();
+  const auto text = NSString::stringWithASCII(narrow);
+  const auto other = NSString::stringWithASCII(narrow);
+  const auto wideText = NSString::stringWithUTF16(wide);
+  const auto otherWide = NSString::stringWithUTF16(wide);
+  expectCanBeEnded("ASCII", [&] { static_cast<void>(NSString::stringWithASCII(narrow)); });
+  expectCanBeEnded("UTF-16", [&] { static_cast<void>(NSString::stringWithUTF16(wide)); });
+  expectCanBeEnded("from UTF-8", [&] { static_cast<void>(NSString::stringWithUTF8(encoded)); });
+  expectCanBeEnded("to UTF-8", [&] { static_cast<void>(text->utf8()); });
+  expectCanBeEnded("wide to UTF-8", [&] { static_cast<void>(wideText->utf8()); });
+  expectCanBeEnded("to UTF-16", [&] { static_cast<void>(text->view().utf16()); });
+  expectCanBeEnded("hash", [&] { static_cast<void>(text->hash()); });
+  expectCanBeEnded("equality", [&] { static_cast<void>(text->isEqualToString(*other)); });
+  expectCanBeEnded("order", [&] { static_cast<void>(wideText->compare(*otherWide)); });
+  expectCanBeEnded("appending", [&] { NSMutableString().append(text->view()); });
+  expectCanBeEnded("appending wide", [&] { NSMutableString().append(wideText->view()); });
+  expectCanBeEnded("widening", [&] {
+    NSMutableString mutableText;
+    mutableText.append(text->view().substring(0, longLength / 5));
+    mutableText.append(u'\u00E9');
+    mutableText.append(text->view().substring(0, longLength / 5));
+  });
+}
+
+TEST(WorkMeter, MappingsOfALongTextCanBeEnded) {
+  const std::u16string sigmas(longLength, u'\u03A3');
+  const std::u16string ignorable(longLength, u'\u0301');
+  expectCanBeEnded("sigmas", [&] { static_cast<void>(lowerCasedText(sigmas)); });
+  expectCanBeEnded("ignorable", [&] { static_cast<void>(lowerCasedText(ignorable)); });
+  expectCanBeEnded("upper case", [&] { static_cast<void>(upperCasedText(sigmas)); });
+  expectCanBeEnded("code points", [&] { static_cast<void>(codePointsOfText(sigmas)); });
+  const std::vector<int32_t> points(longLength, 0x3A3);
+  expectCanBeEnded("from code points", [&] { static_cast<void>(textWithCodePoints(points)); });
+}
+
+TEST(WorkMeter, ReadingALongTextCanBeEnded) {
+  const auto expectEnds = [](const char* name, const std::string& text) {
+    double number = 0;
+    NSDecimal decimal;
+    const auto view = NSStringView::ascii(text);
+    expectCanBeEnded(name, [&] { static_cast<void>(scanDouble(view, number)); });
+    expectCanBeEnded(name, [&] { static_cast<void>(NSDecimal::scan(view, decimal)); });
+  };
+  expectEnds("digits", std::string(longLength, '1'));
+  expectEnds("white space", std::string(longLength, ' '));
+  expectEnds("zeros", std::string(longLength, '0'));
+  expectEnds("fraction", "0." + std::string(longLength, '0') + "1");
+  expectEnds("exponent", "1e" + std::string(longLength, '0') + "1");
+  for (const char* unit : {"a", "/", "../", "%41", ":", "?", "#", "a/./"}) {
+    std::string reference = "http:";
+    while (reference.size() < longLength) reference += unit;
+    if (*unit == '#') reference = "#" + std::string(longLength, 'f');
+    const auto text = NSString::stringWithASCII(reference);
+    const auto base = NSURL::URLWithString(NSString::stringWithASCII("http://h/a"));
+    expectCanBeEnded(unit, [&] { static_cast<void>(NSURL::URLWithString(text)); });
+    expectCanBeEnded(unit, [&] { static_cast<void>(NSURL::URLWithString(text, *base)); });
+  }
 }
 
 // --- bytes ---------------------------------------------------------------------------------------

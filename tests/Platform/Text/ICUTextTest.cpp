@@ -153,5 +153,44 @@ TEST(ICUText, ALoneSurrogateHasNoCodePoint) {
   EXPECT_EQ(codePointsOfText(u"\xDE00z"), std::nullopt);
 }
 
+// Wherever a long text is cut, around whatever decides about a sigma.
+TEST(ICUText, AFinalSigmaIsFoundAcrossEveryCut) {
+  const std::u16string rows[] = {
+      u"\u03A3",
+      u"\u03A3a",
+      u"\u03A3'a",
+      u"\u03A3' a",
+      u"'\u03A3",
+      u" \u03A3",
+      u"1\u03A3",
+      u"\u03A3\u03A3\u03A3",
+      u"\U00010400\u03A3",
+      u"\u03A3\U00010400",
+      u"'\u03A3'b",
+      u"Σ''",
+      u"İΣ",
+      u"Σİ",
+  };
+  for (const std::u16string& row : rows) {
+    const std::u16string mapped = lowerCasedText(u"B" + row + u"!");
+    for (size_t before = 8192 - 9; before <= 8192; ++before) {
+      const std::u16string start(before, u'B');
+      EXPECT_TRUE(lowerCasedText(start + row + u"!" + start) ==
+                  std::u16string(before, u'b') + mapped.substr(1) + std::u16string(before, u'b'))
+          << before;
+    }
+  }
+}
+
+TEST(ICUText, ALongTextOfSigmasAndIgnorableCharactersTakesTimeInProportion) {
+  const auto measure = [](size_t length) {
+    std::u16string text;
+    while (text.size() < length) text += u"Σ''́";
+    text += std::u16string(length, u'́');
+    return processorSecondsOf([&] { EXPECT_GE(lowerCasedText(text).size(), length); });
+  };
+  EXPECT_TRUE(growsInProportion(measure, 200000));
+}
+
 }  // namespace
 }  // namespace xquery
