@@ -1,5 +1,6 @@
 #include "Functions/XQueryValueSet.h"
 
+#include "Platform/Numbers/NumberText.h"
 #include "Types/XQueryQName.h"
 #include "Types/XQueryValues.h"
 #include "xquery/Date.h"
@@ -61,7 +62,7 @@ uint64_t XQueryOtherValueHash::operator()(const NSObject* value) const {
 
 uint64_t XQueryValueSet::ExactHash::operator()(const NSDecimal& value) const {
   if (value.isSmallInteger()) return static_cast<uint64_t>(value.smallInteger());
-  return std::hash<std::string>()(value.toString());
+  return hashDigits(value);
 }
 
 bool XQueryValueSet::ObjectEqual::operator()(const NSObject* a, const NSObject* b) const {

@@ -191,23 +191,14 @@ Value numberToBoolean(const Cast& cast) {
   return NSNumber::numberWithBool(!isFalse);
 }
 
-// The rule is to print the number and read the text again. Where the payload is a machine integer,
-// a small decimal or a double, converting it directly gives the same double: the text is exact, or
-// is the shortest that reads back to the value.
+// The rule is to print the number and read the text again. Only of a float this makes a difference:
+// of any other number the text is exact, or is the shortest that reads back to the value.
 Value numberToDouble(const Cast& cast) {
   const NSNumber& number = cast.number();
-  switch (number.storage()) {
-    case NSNumber::Storage::Int64:
-    case NSNumber::Storage::UInt64:
-    case NSNumber::Storage::Double:
-      return doubleNumber(number.doubleValue(), cast.target);
-    case NSNumber::Storage::Decimal:
-      if (!number.storedDecimal()->isSmallInteger()) break;
-      return doubleNumber(static_cast<double>(number.storedDecimal()->smallInteger()), cast.target);
-    default:
-      break;
-  }
-  return textToTarget(cast);
+  const NSDecimal* decimal = number.storedDecimal();
+  const bool isNaN = decimal && decimal->isNaN();
+  if (isNaN || number.storage() == NSNumber::Storage::Float) return textToTarget(cast);
+  return doubleNumber(number.doubleValue(), cast.target);
 }
 
 Value booleanToDouble(const Cast& cast) {

@@ -1,5 +1,6 @@
 // The lexical forms of dates and times. All eight are read by one procedure, which is told the
 // fields that the type has. Numbers are of digits only and nothing is skipped.
+#include "Platform/Base/WorkMeter.h"
 #include "Platform/Dates/GregorianCalendar.h"
 #include "Platform/Numbers/NumberText.h"
 #include "Types/XQueryDate.h"
@@ -45,7 +46,9 @@ class DateReader {
   bool number(uint32_t width, int32_t& out) {
     const uint32_t start = _position;
     int64_t value = 0;
+    WorkPacer pacer;  // a year may begin with millions of zeros
     for (; !atEnd() && _text[_position] >= '0' && _text[_position] <= '9'; ++_position) {
+      pacer.turn();
       value = value * 10 + (_text[_position] - '0');
       if (value > std::numeric_limits<int32_t>::max()) return false;
     }

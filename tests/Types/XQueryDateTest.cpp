@@ -1,3 +1,4 @@
+#include "Platform/Base/ProcessorTime.h"
 #include "Platform/Dates/ZoneTestSupport.h"
 #include "Types/XQueryDate.h"
 #include "TypesTestSupport.h"
@@ -509,6 +510,22 @@ TEST_F(LocalDates, NoLocaleChangesAText) {
     return read(21, "2004-01-01T00:00:05.5Z");
   };
   EXPECT_IN_ZONE("UTC", printed(), "2004-01-01T00:00:05.500000Z");
+}
+
+TEST(XQueryDate, TextsOfMillionsOfDigitsAreReadInTimeInProportion) {
+  const auto measure = [](size_t length) {
+    const std::string zeros(length, '0');
+    const std::string year = zeros + "2004-01-01";
+    const std::string seconds = "12:00:00." + zeros + "5";
+    return processorSecondsOf([&] {
+      EXPECT_TRUE(XQueryDate::xqueryDateFromString(view(year)));
+      EXPECT_TRUE(XQueryDate::xqueryTimeFromString(view(seconds)));
+      EXPECT_FALSE(XQueryDate::xqueryGYearFromString(view(zeros + "x")));
+      EXPECT_FALSE(XQueryDate::xqueryGYearFromString(view("1" + zeros)));
+      EXPECT_FALSE(XQueryDate::xqueryGMonthFromString(view("--" + zeros)));
+    });
+  };
+  EXPECT_TRUE(growsInProportion(measure, 400000));
 }
 
 }  // namespace

@@ -78,6 +78,12 @@ class Comparand {
   bool isNumeric() const {
     return _primitive >= XQueryTypeDouble && _primitive <= XQueryTypeDecimal;
   }
+  // A number that has digits of its own.
+  bool isExact() const {
+    if (!isNumeric()) return false;
+    const NSNumber::Storage storage = number().storage();
+    return storage != NSNumber::Storage::Double && storage != NSNumber::Storage::Float;
+  }
   const NSNumber& number() const { return *cast<NSNumber>(_item); }
   NSStringView text() const { return _text.view(); }
 
@@ -163,7 +169,7 @@ Answer compareTexts(XQueryRelation relation, NSStringView a, NSStringView b) {
 }
 
 Answer compareNumbers(XQueryRelation relation, Comparand& a, Comparand& b) {
-  if (a.isNumeric() && b.isNumeric()) {
+  if (a.isExact() && b.isExact()) {
     if (XQueryIsNaN(a.number()) || XQueryIsNaN(b.number())) return Answer::No;
     return answered(relation.holds(a.number().compare(b.number())));
   }

@@ -14,9 +14,7 @@ double XQueryNumericOperand::asDouble(const NSDecimal& exact) {
       exact.smallInteger() <= XQueryExactIntegerBound) {
     return static_cast<double>(exact.smallInteger());
   }
-  double number = 0;
-  scanDouble(NSStringView::ascii(exact.toString()), number);
-  return number;
+  return exact.doubleValue();
 }
 
 }  // namespace xquery

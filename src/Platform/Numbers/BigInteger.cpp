@@ -1,5 +1,7 @@
 #include "Platform/Numbers/BigInteger.h"
 
+#include <functional>
+
 namespace xquery {
 
 BigInteger BigInteger::fromUnsigned(uint64_t value) {
@@ -46,6 +48,37 @@ BigInteger BigInteger::divide(const BigInteger& divisor) {
 uint32_t BigInteger::removeFactor(uint32_t factor) {
   const BigInteger divisor{int64_t{factor}};
   return static_cast<uint32_t>(mpz_remove(_value, _value, divisor._value));
+}
+
+uint64_t BigInteger::hash() const {
+  const auto* limbs = reinterpret_cast<const char*>(mpz_limbs_read(_value));
+  const size_t hash = std::hash<std::string_view>()({limbs, mpz_size(_value) * sizeof(mp_limb_t)});
+  return sign() < 0 ? ~hash : hash;
+}
+
+// Each product of the power is cut off, and there are less than twenty: the bits are far more than
+// the digits need.
+BigInteger::Digits BigInteger::leadingDigits(uint32_t scale) const {
+  constexpr mp_bitcnt_t bits = 256;
+  mpf_t quotient;
+  mpf_t power;
+  mpf_init2(quotient, bits);
+  mpf_init2(power, bits);
+  mpf_set_z(quotient, _value);
+  mpf_abs(quotient, quotient);
+  mpf_set_ui(power, 10);
+  mpf_pow_ui(power, power, scale);
+  mpf_div(quotient, quotient, power);
+  Digits digits;
+  digits.text.resize(Digits::count + 2);
+  mp_exp_t exponent = 0;
+  mpf_get_str(digits.text.data(), &exponent, 10, Digits::count, quotient);
+  mpf_clear(quotient);
+  mpf_clear(power);
+  digits.text.resize(digits.text.find('\0'));
+  digits.text.resize(Digits::count, '0');
+  digits.exponent = exponent;
+  return digits;
 }
 
 std::string BigInteger::toString() const {

@@ -65,6 +65,18 @@ class BigInteger {
   int compare(const BigInteger& other) const { return mpz_cmp(_value, other._value); }
   int compareMagnitude(const BigInteger& other) const { return mpz_cmpabs(_value, other._value); }
   std::string toString() const;
+  uint64_t hash() const;
+
+  // The first digits of a magnitude: 0.ddd times ten to the power of `exponent`. The last digit may
+  // be off by one.
+  struct Digits {
+    static constexpr size_t count = 40;
+    std::string text;
+    int64_t exponent = 0;
+  };
+  // Of the value divided by ten to the power of `scale`, in a time that does not depend on either.
+  // The value is not zero.
+  Digits leadingDigits(uint32_t scale) const;
 
  private:
   static_assert(sizeof(long) == sizeof(int64_t), "GMP's native integers must have 64 bits");

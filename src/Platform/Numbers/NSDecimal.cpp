@@ -16,6 +16,7 @@
 #include <limits>
 #include <memory>
 #include <numeric>
+#include <optional>
 #include <stdexcept>
 
 namespace xquery {
@@ -93,10 +94,20 @@ uint32_t removeSmallFactor(int64_t& value, int64_t factor) {
   return count;
 }
 
-// The coefficient of a large decimal: counted as memory of values, and its making as work. The
-// slowest operations take about a millisecond per 10,000 digits.
+// The slowest operations take about a millisecond per 10,000 digits, that is 4,000 bytes; those
+// that only read or add take no more than copying memory does.
+constexpr size_t bytesPerStep = 128;
+constexpr size_t bytesPerReadingStep = size_t{16} * 1024;
+
+void checkMaking(const BigInteger& a, const BigInteger& b) {
+  checkWork((a.bytes() + b.bytes()) / bytesPerStep);
+}
+void checkReading(const BigInteger& a, const BigInteger& b) {
+  checkWork((a.bytes() + b.bytes()) / bytesPerReadingStep);
+}
+
+// The coefficient of a large decimal: counted as memory of values, and its making as work.
 BigInteger* kept(BigInteger coefficient) {
-  constexpr size_t bytesPerStep = 128;
   const size_t bytes = coefficient.bytes();
   auto owned = std::make_unique<BigInteger>(std::move(coefficient));
   countValueBlock(bytes);
@@ -163,11 +174,27 @@ class NSDecimalArithmetic {
     const int32_t difference = a._scale - b._scale;
     if (difference > 0) alignedB.multiplyByPowerOfTen(static_cast<uint32_t>(difference));
     if (difference < 0) alignedA.multiplyByPowerOfTen(static_cast<uint32_t>(-difference));
+    if (difference == 0) {
+      checkReading(alignedA, alignedB);
+    } else {
+      checkMaking(alignedA, alignedB);
+    }
   }
 
-  // The decimal exponent of the first digit, or one more.
-  static int64_t magnitudeAtMost(const NSDecimal& value) {
-    return static_cast<int64_t>(coefficient(value).digitsAtMost()) - value._scale;
+  static BigInteger::Digits leadingDigits(const NSDecimal& value) {
+    const auto scale = static_cast<uint32_t>(value._scale);
+    if (value._state == NSDecimal::Big) return value._big->leadingDigits(scale);
+    return BigInteger(value._coefficient).leadingDigits(scale);
+  }
+  // The order of two magnitudes by their first digits; 0 when these do not decide it.
+  static int compareLeadingDigits(const NSDecimal& a, const NSDecimal& b);
+  static std::optional<double> doubleByLeadingDigits(const NSDecimal& value);
+  static uint64_t hashDigits(const NSDecimal& value) {
+    if (value._state != NSDecimal::Big) {
+      return static_cast<uint64_t>(value._coefficient) * 31 + static_cast<uint64_t>(value._scale);
+    }
+    checkReading(*value._big, *value._big);
+    return value._big->hash() * 31 + static_cast<uint64_t>(value._scale);
   }
 
   static bool divideSmall(const NSDecimal& a, const NSDecimal& b, NSDecimal& quotient);
@@ -231,25 +258,54 @@ NSDecimal NSDecimal::notANumber() {
   return result;
 }
 
+namespace {
+
+// The digits of a mantissa from the first to the last that is not zero, as positions in the text.
+struct SignificantDigits {
+  uint32_t first, end;
+  uint32_t point;
+
+  SignificantDigits(NSStringView text, const NumberExtent& extent)
+      : first(extent.digits), end(extent.mantissaEnd), point(extent.point) {
+    const auto isNoPart = [&](uint32_t at) { return at == point || text[at] == '0'; };
+    WorkPacer pacer;
+    for (; first < end && isNoPart(first); ++first) pacer.turn();
+    for (; end > first && isNoPart(end - 1); --end) pacer.turn();
+  }
+  bool isEmpty() const { return first == end; }
+  int64_t count() const { return int64_t{end} - first - (holdsPoint() ? 1 : 0); }
+  // Of the last digit: how far behind the point it stands, negative before the point.
+  int64_t scale() const {
+    const int64_t places = int64_t{end} - 1 - point;
+    return places < 0 ? places + 1 : places;
+  }
+  std::string digits(NSStringView text) const {
+    std::string digits;
+    digits.reserve(static_cast<size_t>(count()));
+    for (uint32_t at = first; at < end; ++at) {
+      if (at != point) digits += static_cast<char>(text[at]);
+    }
+    return digits;
+  }
+
+ private:
+  bool holdsPoint() const { return point > first && point < end; }
+};
+
+}  // namespace
+
 bool NSDecimal::scan(NSStringView text, NSDecimal& out) {
   NumberExtent extent;
   if (!findNumber(text, extent)) return false;
-  std::string digits = text.substring(extent.digits, extent.point - extent.digits).utf8();
-  if (extent.mantissaEnd > extent.point) {
-    text.substring(extent.point + 1, extent.mantissaEnd - extent.point - 1).appendUTF8To(digits);
-  }
-  int64_t scale = extent.mantissaEnd > extent.point ? extent.mantissaEnd - extent.point - 1 : 0;
-  scale -= extent.exponent;
-  digits.erase(0, digits.find_first_not_of('0'));
-  if (digits.empty()) {
+  const SignificantDigits significant(text, extent);
+  if (significant.isEmpty()) {
     out = NSDecimal();
     return true;
   }
-  const size_t trailing = digits.size() - 1 - digits.find_last_not_of('0');
-  digits.resize(digits.size() - trailing);
-  scale -= static_cast<int64_t>(trailing);
-  const int64_t length = static_cast<int64_t>(digits.size()) - std::min<int64_t>(scale, 0);
+  const int64_t scale = significant.scale() - extent.exponent;
+  const int64_t length = significant.count() - std::min<int64_t>(scale, 0);
   if (length > maximumDigits || scale > maximumDigits) return false;
+  const std::string digits = significant.digits(text);
   if (length <= maximumSmallPower && scale >= 0) {
     int64_t coefficient = 0;
     std::from_chars(digits.data(), digits.data() + digits.size(), coefficient);
@@ -399,6 +455,7 @@ NSDecimal NSDecimalArithmetic::divideBig(const NSDecimal& a, const NSDecimal& b)
   const int64_t point = int64_t{a._scale} - b._scale;
   const BigInteger denominator = coefficient(b);
   BigInteger numerator = coefficient(a);
+  checkMaking(numerator, denominator);
   BigInteger rest = denominator;
   int64_t twos = -int64_t{rest.removeFactor(2)};
   int64_t fives = -int64_t{rest.removeFactor(5)};
@@ -439,6 +496,7 @@ NSDecimal NSDecimal::integerDivide(const NSDecimal& divisor) const {
   BigInteger bigA;
   BigInteger bigB;
   Arithmetic::alignBig(*this, divisor, bigA, bigB);
+  checkMaking(bigA, bigB);
   bigA.divide(bigB);
   return Arithmetic::big(std::move(bigA), 0);
 }
@@ -454,6 +512,7 @@ NSDecimal NSDecimal::remainder(const NSDecimal& divisor) const {
   BigInteger bigA;
   BigInteger bigB;
   Arithmetic::alignBig(*this, divisor, bigA, bigB);
+  checkMaking(bigA, bigB);
   return Arithmetic::big(bigA.divide(bigB), scale);
 }
 
@@ -483,6 +542,7 @@ NSDecimal NSDecimalArithmetic::roundSmall(const NSDecimal& value, int64_t drop, 
 NSDecimal NSDecimalArithmetic::roundBig(const NSDecimal& value, int64_t drop, int32_t scale,
                                         NSRoundingMode mode) {
   BigInteger quotient = *value._big;
+  checkMaking(quotient, quotient);
   const bool negative = quotient.sign() < 0;
   if (negative) quotient.negate();
   CutOff cut = CutOff::BelowHalf;
@@ -509,17 +569,32 @@ NSDecimal NSDecimal::rounded(int32_t scale, NSRoundingMode mode) const {
                          : Arithmetic::roundBig(*this, drop, scale, mode);
 }
 
+// The two may be off by one in the last digit each.
+int NSDecimalArithmetic::compareLeadingDigits(const NSDecimal& a, const NSDecimal& b) {
+  const BigInteger::Digits first = leadingDigits(a);
+  const BigInteger::Digits second = leadingDigits(b);
+  const int64_t difference = first.exponent - second.exponent;
+  if (difference > 1 || difference < -1) return difference > 0 ? 1 : -1;
+  // One more digit for what is ten times as large, as it is next to a power of ten.
+  BigInteger distance = BigInteger::fromDigits(first.text + (difference > 0 ? "0" : ""));
+  distance.subtract(BigInteger::fromDigits(second.text + (difference < 0 ? "0" : "")));
+  constexpr size_t uncertainDigits = 2;
+  return distance.digitsAtMost() > uncertainDigits + 1 ? distance.sign() : 0;
+}
+
 int NSDecimal::compare(const NSDecimal& other) const {
   int64_t a = 0;
   int64_t b = 0;
   if (Arithmetic::align(*this, other, a, b)) return a < b ? -1 : a > b ? 1 : 0;
   if (isNaN() || other.isNaN()) return (other.isNaN() ? 1 : 0) - (isNaN() ? 1 : 0);
   if (sign() != other.sign()) return sign() < other.sign() ? -1 : 1;
-  // Magnitudes far apart decide without the powers of ten in between.
-  const int64_t difference =
-      Arithmetic::magnitudeAtMost(*this) - Arithmetic::magnitudeAtMost(other);
-  if (difference > 1) return sign();
-  if (difference < -1) return -sign();
+  if (_state == Big && other._state == Big && _scale == other._scale) {
+    checkReading(*_big, *other._big);
+    const int order = _big->compare(*other._big);
+    return order < 0 ? -1 : order > 0 ? 1 : 0;
+  }
+  // What is not nearly equal is ordered without the powers of ten in between.
+  if (const int order = Arithmetic::compareLeadingDigits(*this, other)) return order * sign();
   BigInteger bigA;
   BigInteger bigB;
   Arithmetic::alignBig(*this, other, bigA, bigB);
@@ -529,6 +604,28 @@ int NSDecimal::compare(const NSDecimal& other) const {
 
 uint32_t NSDecimal::hash() const {
   return hashDouble(doubleValue());
+}
+
+uint64_t hashDigits(const NSDecimal& value) {
+  return NSDecimalArithmetic::hashDigits(value);
+}
+
+// The double nearest to all that begins with the digits, where these decide it.
+std::optional<double> NSDecimalArithmetic::doubleByLeadingDigits(const NSDecimal& value) {
+  const BigInteger::Digits digits = leadingDigits(value);
+  const std::string exponent =
+      "e" + std::to_string(digits.exponent - static_cast<int64_t>(BigInteger::Digits::count));
+  const auto nearestTo = [&](int64_t off) {
+    BigInteger number = BigInteger::fromDigits(digits.text);
+    number.add(BigInteger(off));
+    const std::string text = number.toString() + exponent;
+    double nearest = 0;
+    scanDouble(NSStringView::ascii(text), nearest);
+    return nearest;
+  };
+  const double below = nearestTo(-2);
+  if (below != nearestTo(2)) return std::nullopt;
+  return value.sign() < 0 ? -below : below;
 }
 
 double NSDecimal::doubleValue() const {
@@ -545,6 +642,10 @@ double NSDecimal::doubleValue() const {
     if (_scale <= exactPowers && _coefficient <= exactIntegers && _coefficient >= -exactIntegers) {
       return value / powers[_scale];
     }
+  }
+  if (_state == Big) {
+    if (const auto nearest = Arithmetic::doubleByLeadingDigits(*this)) return *nearest;
+    checkMaking(*_big, *_big);
   }
   const std::string digits = _state == Big ? _big->toString() : std::to_string(_coefficient);
   double value = 0;
@@ -573,6 +674,7 @@ std::string NSDecimal::toString() const {
     char buffer[24];
     text.assign(buffer, std::to_chars(buffer, buffer + sizeof buffer, _coefficient).ptr);
   } else {
+    checkMaking(*_big, *_big);
     text = _big->toString();
   }
   if (_scale == 0) return text;

@@ -2,11 +2,15 @@
 // here depends on the locale of the process.
 #include "Platform/Numbers/NumberText.h"
 
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Number.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
 #include <limits>
+#include <optional>
+#include <string>
 
 namespace xquery {
 
@@ -28,8 +32,9 @@ struct Scanner {
   uint32_t position = 0;
 
   char16_t unit(uint32_t at) const { return at < length ? static_cast<char16_t>(text[at]) : 0; }
-  void skipDigits() {
-    while (isDigit(unit(position))) ++position;
+  void skip(bool (*isSkipped)(char16_t)) {
+    WorkPacer pacer;
+    for (; isSkipped(unit(position)); ++position) pacer.turn();
   }
   // Whether a minus was skipped.
   bool skipSign() {
@@ -47,7 +52,9 @@ void findExponent(Scanner<Unit>& scanner, NumberExtent& extent) {
   ++scanner.position;
   const bool negative = scanner.skipSign();
   const uint32_t first = scanner.position;
+  WorkPacer pacer;
   for (; isDigit(scanner.unit(scanner.position)); ++scanner.position) {
+    pacer.turn();
     if (extent.exponent < exponentBound) {
       extent.exponent = extent.exponent * 10 + (scanner.unit(scanner.position) - '0');
     }
@@ -59,15 +66,15 @@ void findExponent(Scanner<Unit>& scanner, NumberExtent& extent) {
 template <class Unit>
 bool findNumberIn(const Unit* text, uint32_t length, NumberExtent& extent) {
   Scanner<Unit> scanner{text, length};
-  while (isWhite(scanner.unit(scanner.position))) ++scanner.position;
+  scanner.skip(isWhite);
   extent.negative = scanner.skipSign();
   extent.digits = scanner.position;
-  scanner.skipDigits();
+  scanner.skip(isDigit);
   extent.point = scanner.position;
   uint32_t digitCount = extent.point - extent.digits;
   if (scanner.unit(scanner.position) == '.') {
     ++scanner.position;
-    scanner.skipDigits();
+    scanner.skip(isDigit);
     digitCount += scanner.position - extent.point - 1;
   }
   extent.mantissaEnd = scanner.position;
@@ -77,26 +84,72 @@ bool findNumberIn(const Unit* text, uint32_t length, NumberExtent& extent) {
   return true;
 }
 
-// The reader does not tell overflow from underflow: the decimal exponent of the first digit that is
-// not zero does.
-bool isAboveOne(std::string_view mantissa, int64_t exponent) {
-  const size_t point = std::min(mantissa.find('.'), mantissa.size());
-  const size_t first = mantissa.find_first_not_of("0.");
-  if (first == std::string_view::npos) return false;
-  const int64_t place = first < point ? static_cast<int64_t>(point - first) - 1
-                                      : -static_cast<int64_t>(first - point);
-  return place + exponent >= 0;
-}
+// The digits of a number that decide which double is nearest: those from the first that is not zero
+// on, as many as the exact value of a point halfway between two doubles may have. Of more it counts
+// only whether any is not zero, which a last digit of 1 says as well.
+struct LeadingDigits {
+  static constexpr size_t most = 800;
+  std::string text;
+  int64_t exponent = 0;  // of ten, that the text as an integer is multiplied by
 
-double readDouble(std::string_view text, const NumberExtent& extent) {
+  template <class Unit>
+  LeadingDigits(const Unit* number, const NumberExtent& extent) {
+    int64_t dropped = 0;
+    bool dropsSome = false;  // other than zeros
+    WorkPacer pacer;
+    for (uint32_t at = extent.digits; at < extent.mantissaEnd; ++at) {
+      pacer.turn();
+      if (at == extent.point) continue;
+      const auto digit = static_cast<char>(number[at]);
+      if (text.empty() && digit == '0') continue;
+      if (text.size() < most) {
+        text += digit;
+      } else {
+        ++dropped;
+        dropsSome = dropsSome || digit != '0';
+      }
+    }
+    if (dropsSome) {
+      text += '1';
+      --dropped;
+    }
+    const uint32_t point = std::min(extent.point + 1, extent.mantissaEnd);
+    exponent = extent.exponent + dropped - static_cast<int64_t>(extent.mantissaEnd - point);
+  }
+};
+
+double doubleOf(const LeadingDigits& digits) {
+  // Far outside what a double holds, and within what its reader takes for an exponent.
+  constexpr int64_t farExponent = 10000;
+  if (digits.text.empty()) return 0;
+  const int64_t exponent = std::clamp(digits.exponent, -farExponent, farExponent);
+  const std::string text = digits.text + 'e' + std::to_string(exponent);
   double value = 0;
   const std::from_chars_result read =
       std::from_chars(text.data(), text.data() + text.size(), value, std::chars_format::general);
-  if (read.ec == std::errc::result_out_of_range) {
-    const std::string_view mantissa = text.substr(0, extent.mantissaEnd - extent.digits);
-    value = isAboveOne(mantissa, extent.exponent) ? std::numeric_limits<double>::infinity() : 0.0;
+  if (read.ec != std::errc::result_out_of_range) return value;
+  // The reader does not tell overflow from underflow.
+  const bool isLarge = static_cast<int64_t>(digits.text.size()) + digits.exponent > 0;
+  return isLarge ? std::numeric_limits<double>::infinity() : 0;
+}
+
+// Of a short number, which its reader takes as it stands: that is what most are.
+std::optional<double> readShort(NSStringView text, const NumberExtent& extent) {
+  constexpr uint32_t longest = 64;
+  const uint32_t length = extent.end - extent.digits;
+  if (length > longest) return std::nullopt;
+  char narrow[longest];
+  const char* first = narrow;
+  if (text.isWide()) {
+    std::copy_n(text.wideUnits() + extent.digits, length, narrow);
+  } else {
+    first = text.asciiUnits() + extent.digits;
   }
-  return extent.negative ? -value : value;
+  double value = 0;
+  const std::from_chars_result read =
+      std::from_chars(first, first + length, value, std::chars_format::general);
+  if (read.ec == std::errc::result_out_of_range) return std::nullopt;
+  return value;
 }
 
 // Shortest digits, plain for decimal exponents from -4 to 16.
@@ -154,12 +207,12 @@ uint32_t hashDouble(double value) {
 bool scanDouble(NSStringView text, double& out) {
   NumberExtent extent;
   if (!findNumber(text, extent)) return false;
-  const NSStringView number = text.substring(extent.digits, extent.end - extent.digits);
-  if (number.isWide()) {
-    out = readDouble(number.utf8(), extent);
-  } else {
-    out = readDouble({number.asciiUnits(), number.length()}, extent);
+  std::optional<double> value = readShort(text, extent);
+  if (!value) {
+    value = doubleOf(text.isWide() ? LeadingDigits(text.wideUnits(), extent)
+                                   : LeadingDigits(text.asciiUnits(), extent));
   }
+  out = extent.negative ? -*value : *value;
   return true;
 }
 

@@ -1,7 +1,7 @@
 // What decimals and platform numbers share: reading digits and the hash of a numeric value.
 #pragma once
 
-#include "xquery/String.h"
+#include "xquery/Number.h"
 
 #include <cstdint>
 
@@ -23,5 +23,7 @@ bool findNumber(NSStringView text, NumberExtent& extent);
 
 // Equal numbers hash alike whatever their storage, because all hash as the double nearest to them.
 uint32_t hashDouble(double value);
+// Of every digit: decimals that are equal as doubles differ in it.
+uint64_t hashDigits(const NSDecimal& value);
 
 }  // namespace xquery

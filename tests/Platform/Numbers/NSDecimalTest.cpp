@@ -1,4 +1,6 @@
 #include "Platform/Base/ProcessorTime.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Numbers/NumberText.h"
 #include "xquery/Number.h"
 
 #include <gtest/gtest.h>
@@ -502,6 +504,96 @@ TEST(Decimal, OneRepresentationPerValue) {
   EXPECT_TRUE(decimal("1e19").isInteger());
   EXPECT_TRUE(decimal("1e19").divide(decimal("1e19")).isSmallInteger());
   EXPECT_FALSE(decimal("1.5").isInteger());
+}
+
+// --- many digits ---------------------------------------------------------------------------------
+
+std::string randomDigits(std::mt19937_64& random, size_t count) {
+  std::string digits;
+  for (size_t index = 0; index < count; ++index) {
+    digits += static_cast<char>('0' + static_cast<int>(random() % 10));
+  }
+  return digits;
+}
+
+double readAsDouble(const std::string& text) {
+  double value = 0;
+  EXPECT_TRUE(scanDouble(NSStringView::ascii(text), value));
+  return value;
+}
+
+TEST(Decimal, ALargeOneHasTheDoubleThatItsTextHas) {
+  std::mt19937_64 random(5);
+  for (int round = 0; round < 500; ++round) {
+    std::string text = round % 2 ? "-" : "";
+    text += randomDigits(random, 1 + random() % 400) + "." + randomDigits(random, random() % 400);
+    EXPECT_EQ(decimal(text).doubleValue(), readAsDouble(text)) << text;
+  }
+  // At and next to the point halfway between two doubles, where the first digits do not tell.
+  const std::string zeros(600, '0');
+  EXPECT_EQ(decimal("9007199254740993").doubleValue(), 9007199254740992.0);
+  EXPECT_EQ(decimal("9007199254740993." + zeros + "1").doubleValue(), 9007199254740994.0);
+  EXPECT_EQ(decimal("9007199254740992." + std::string(600, '9')).doubleValue(), 9007199254740992.0);
+  EXPECT_EQ(decimal("-9007199254740993." + zeros + "1").doubleValue(), -9007199254740994.0);
+  EXPECT_EQ(decimal("1" + zeros).doubleValue(), std::numeric_limits<double>::infinity());
+  EXPECT_EQ(decimal("0." + zeros + "1").doubleValue(), 0);
+}
+
+TEST(Decimal, TheOrderOfLargeOnesIsThatOfTheirDifference) {
+  std::mt19937_64 random(6);
+  // Nearly the same: of another last digit, another length or another place of the point.
+  const auto variant = [&](std::string text) {
+    if (random() % 2) text.back() = static_cast<char>('1' + static_cast<int>(random() % 9));
+    if (random() % 2) text += randomDigits(random, random() % 30);
+    const size_t point = 30 + (random() % 4 == 0 ? random() % 2 : 0);
+    return (random() % 8 == 0 ? "-" : "") + text.substr(0, point) + "." + text.substr(point);
+  };
+  for (int round = 0; round < 2000; ++round) {
+    std::string digits = randomDigits(random, 35 + random() % 20);
+    if (random() % 4 == 0) digits = std::string(40, random() % 2 ? '9' : '0') + digits;
+    const NSDecimal a = decimal(variant("1" + digits));
+    const NSDecimal b = decimal(variant(random() % 4 ? "1" + digits : digits));
+    EXPECT_EQ(a.compare(b), a.subtract(b).sign()) << a.toString() << " " << b.toString();
+    EXPECT_EQ(b.compare(a), -a.compare(b));
+    EXPECT_EQ(hashDigits(a) == hashDigits(b), a.compare(b) == 0);
+  }
+}
+
+TEST(Decimal, ComparingAndConvertingLargeOnesTakesNoTimeForTheirDigits) {
+  const auto measure = [](size_t length) {
+    const NSDecimal a = decimal(std::string(length, '7') + "." + std::string(length, '3'));
+    const NSDecimal b = decimal(std::string(length, '7') + "." + std::string(length + 1, '3'));
+    const NSDecimal c = decimal(std::string(length, '8') + ".1");
+    return processorSecondsOf([&] {
+      for (int times = 0; times < 200; ++times) {
+        EXPECT_NE(a.doubleValue(), 0);
+        EXPECT_EQ(a.compare(c), -1);
+        EXPECT_EQ(c.compare(b), 1);
+        EXPECT_NE(hashDigits(a), hashDigits(b));
+      }
+    });
+  };
+  EXPECT_TRUE(growsInProportion(measure, 80000));
+}
+
+TEST(Decimal, WorkOnManyDigitsIsCharged) {
+  const NSDecimal large = decimal(std::string(100000, '7') + ".3");
+  const NSDecimal near = decimal(std::string(100000, '7') + ".33");
+  const auto stepsOf = [](auto work) {
+    const int64_t before = workMeter.stepsLeft;
+    work();
+    return before - workMeter.stepsLeft;
+  };
+  constexpr int64_t most = 100000;
+  for (const int64_t steps : {stepsOf([&] { EXPECT_EQ(large.compare(near), -1); }),
+                              stepsOf([&] { static_cast<void>(large.toString()); }),
+                              stepsOf([&] { static_cast<void>(large.integerDivide(near)); }),
+                              stepsOf([&] { static_cast<void>(near.remainder(near)); }),
+                              stepsOf([&] { static_cast<void>(large.divide(large)); }),
+                              stepsOf([&] { static_cast<void>(large.subtract(large)); })}) {
+    EXPECT_GT(steps, 1);
+    EXPECT_LT(steps, most);
+  }
 }
 
 }  // namespace

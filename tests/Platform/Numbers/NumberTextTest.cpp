@@ -161,5 +161,30 @@ TEST(NumberText, LocaleOfTheProcessChangesNothing) {
   if (comma) std::setlocale(LC_ALL, "C");
 }
 
+TEST(NumberText, ALongNumberIsTheDoubleNearestToAllItsDigits) {
+  const auto read = [](const std::string& text) {
+    double value = -1;
+    EXPECT_TRUE(scanDouble(NSStringView::ascii(text), value));
+    return value;
+  };
+  const std::string zeros(2000, '0');
+  EXPECT_EQ(read("9007199254740993." + zeros), 9007199254740992.0);
+  EXPECT_EQ(read("9007199254740993." + zeros + "1"), 9007199254740994.0);
+  EXPECT_EQ(read("9007199254740993" + zeros + "1e-2001"), 9007199254740994.0);
+  EXPECT_EQ(read("0." + zeros + "15e2000"), 0.15);
+  EXPECT_EQ(read(zeros + "1.5"), 1.5);
+  EXPECT_EQ(read("-" + zeros), 0);
+  EXPECT_TRUE(std::signbit(read("-" + zeros)));
+  EXPECT_EQ(read("1" + zeros), std::numeric_limits<double>::infinity());
+  EXPECT_EQ(read("-1" + zeros + "e99999999999999999999"), -std::numeric_limits<double>::infinity());
+  EXPECT_EQ(read("1" + zeros + "e-2000"), 1);
+  EXPECT_EQ(read("1e-99999999999999999999"), 0);
+  EXPECT_EQ(read("." + zeros + "5"), 0);
+  EXPECT_EQ(read("5." + zeros + "e1"), 50);
+  EXPECT_EQ(read("4.9e-324" + zeros), 0);
+  EXPECT_EQ(read("4.9406564584124654e-324"), 4.9406564584124654e-324);
+  EXPECT_EQ(read(std::string(310, '1') + "e-305"), 11111.111111111111111111111);
+}
+
 }  // namespace
 }  // namespace xquery
