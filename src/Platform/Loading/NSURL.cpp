@@ -1,5 +1,5 @@
 #include "Platform/Loading/PercentEscapes.h"
-#include "Platform/Loading/URIParser.h"
+#include "Platform/Loading/URIReference.h"
 #include "Platform/Text/ASCII.h"
 #include "xquery/URL.h"
 
@@ -11,28 +11,9 @@ namespace xquery {
 
 namespace {
 
-struct Parts {
-  std::string_view scheme, authority, path;
-};
-
-// Of a text that is a URI reference.
-Parts partsOf(const NSString& reference) {
-  const NSStringView view = reference.view();
-  std::string_view rest(view.asciiUnits(), view.length());
-  rest = rest.substr(0, rest.find_first_of("?#"));
-  Parts parts;
-  // A colon after a slash belongs to the path.
-  if (const size_t end = rest.find_first_of(":/"); end != rest.npos && rest[end] == ':') {
-    parts.scheme = rest.substr(0, end);
-    rest.remove_prefix(end + 1);
-  }
-  if (rest.substr(0, 2) == "//") {
-    const size_t end = rest.find('/', 2);
-    parts.authority = rest.substr(2, end == rest.npos ? end : end - 2);
-    rest = end == rest.npos ? std::string_view() : rest.substr(end);
-  }
-  parts.path = rest;
-  return parts;
+std::string_view textOf(const NSString& string) {
+  const NSStringView view = string.view();
+  return {view.asciiUnits(), view.length()};
 }
 
 // What a path may hold as it is, of the characters that a URL allows there.
@@ -68,28 +49,23 @@ Ref<NSURL> NSURL::fileURLWithPath(std::string_view path) {
 
 Ref<NSURL> NSURL::URLWithString(const Ref<NSString>& text) {
   // Every character of a URI is ASCII.
-  if (!text || text->view().isWide()) return nullptr;
-  const NSStringView view = text->view();
-  if (!isURIReference({view.asciiUnits(), view.length()})) return nullptr;
+  if (!text || text->view().isWide() || !isURIReference(textOf(*text))) return nullptr;
   return make<NSURL>(text);
 }
 
 Ref<NSURL> NSURL::URLWithString(const Ref<NSString>& text, const NSURL& base) {
   if (!text || text->view().isWide()) return nullptr;
-  const NSStringView reference = text->view();
-  const NSStringView baseText = base._text->view();
-  const std::optional<std::string> resolved = resolveURIReference(
-      {reference.asciiUnits(), reference.length()}, {baseText.asciiUnits(), baseText.length()});
+  const std::optional<URIText> resolved = resolveURIReference(textOf(*text), textOf(*base._text));
   if (!resolved) return nullptr;
   return make<NSURL>(NSString::stringWithASCII(*resolved), text);
 }
 
 std::string NSURL::scheme() const {
-  return lowerCase(partsOf(*_text).scheme);
+  return lowerCase(partsOfURIReference(textOf(*_text)).scheme.value_or(""));
 }
 
 std::string NSURL::host() const {
-  std::string_view host = partsOf(*_text).authority;
+  std::string_view host = partsOfURIReference(textOf(*_text)).authority.value_or("");
   if (const size_t at = host.rfind('@'); at != host.npos) host.remove_prefix(at + 1);
   // A colon inside brackets is part of an IPv6 address.
   const size_t colon = host.rfind(':');
@@ -98,11 +74,11 @@ std::string NSURL::host() const {
 }
 
 std::string NSURL::path() const {
-  return unescaped(partsOf(*_text).path);
+  return unescaped(partsOfURIReference(textOf(*_text)).path);
 }
 
 std::string NSURL::relativePath() const {
-  return unescaped(partsOf(*_reference).path);
+  return unescaped(partsOfURIReference(textOf(*_reference)).path);
 }
 
 }  // namespace xquery

@@ -1,6 +1,7 @@
 // Escapes of URLs.
 #pragma once
 
+#include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/ASCII.h"
 
 #include <string>
@@ -16,7 +17,10 @@ inline int hexadecimalDigit(char digit) {
 // Of a part of a URI reference, where two digits follow each percent sign.
 inline std::string unescaped(std::string_view text) {
   std::string out;
+  out.reserve(text.size());
+  WorkPacer pacer;
   for (size_t index = 0; index < text.size(); ++index) {
+    pacer.turn();
     char byte = text[index];
     if (byte == '%' && index + 2 < text.size()) {
       byte = static_cast<char>(hexadecimalDigit(text[index + 1]) * 16 +

@@ -128,6 +128,51 @@ TEST(URL, ResolutionKeepsEveryPartAsWritten) {
   EXPECT_EQ(resolved("#c", "mailto:x"), "mailto:x#c");
 }
 
+TEST(URL, AddressesAreCheckedGroupByGroup) {
+  for (const char* address :
+       {"[::]", "[::1]", "[1::]", "[1:2:3:4:5:6:7:8]", "[1:2:3:4:5:6:7::]", "[::2:3:4:5:6:7:8]",
+        "[1:2:3:4:5:6:1.2.3.4]", "[::255.255.255.255]", "[abcd:EF01::1]", "[v1.a]", "[VF.a:b!]"}) {
+    EXPECT_TRUE(NSURL::URLWithString(text(std::string("http://") + address + ":80/"))) << address;
+  }
+  for (const char* address : {"[]",
+                              "[:]",
+                              "[:::]",
+                              "[1:2:3:4:5:6:7]",
+                              "[1:2:3:4:5:6:7:8:9]",
+                              "[1::2::3]",
+                              "[12345::]",
+                              "[1:2:3:4:5:6:7:8::]",
+                              "[1.2.3.4::]",
+                              "[::1.2.3]",
+                              "[::1.2.3.256]",
+                              "[::01.2.3.4]",
+                              "[v.a]",
+                              "[v1.]",
+                              "[vg.a]",
+                              "[v1.a@]",
+                              "[::1]x",
+                              "[::1",
+                              "::1]",
+                              "h:8a",
+                              "a@b@c",
+                              "a[@h"}) {
+    EXPECT_FALSE(NSURL::URLWithString(text(std::string("http://") + address + "/"))) << address;
+  }
+}
+
+TEST(URL, APathWithoutAnAuthorityDoesNotComeToHaveOne) {
+  EXPECT_EQ(resolved("/.//b", "urn:/a"), "urn:/.//b");
+  EXPECT_EQ(resolved("..//b", "file:/x/y"), "file:/.//b");
+  EXPECT_EQ(resolved("..", "urn:/a/b"), "urn:/");
+  EXPECT_EQ(resolved(".//b", "http://h/a"), "http://h//b");
+}
+
+TEST(URL, DotsAtTheStartOfAPathWithoutASlashMeanNothing) {
+  EXPECT_EQ(resolved("../../c", "urn:a/b"), "urn:/c");
+  EXPECT_EQ(resolved("./c", "urn:b"), "urn:c");
+  EXPECT_EQ(resolved("../c", "urn:b"), "urn:c");
+}
+
 TEST(URL, ResolutionNeedsAnAbsoluteBaseAndAReference) {
   EXPECT_EQ(resolved("c", "/x"), "(null)");
   EXPECT_EQ(resolved("c", ""), "(null)");
@@ -213,6 +258,8 @@ TEST(URL, VeryLongReferencesAreHandled) {
   EXPECT_EQ(resolved(path, "http://h/x"), "http://h/a/");
   const std::string letters(1000000, 'a');
   EXPECT_EQ(resolved(letters, "http://h/x"), "http://h/" + letters);
+  const std::string slashes(1000000, '/');
+  EXPECT_EQ(resolved("." + slashes, "http://h/x"), "http://h" + slashes);
 }
 
 }  // namespace
