@@ -7,6 +7,7 @@
 #include "xquery/Error.h"
 #include "xquery/Limits.h"
 #include "xquery/Loading.h"
+#include "xquery/Memory.h"
 #include "xquery/Number.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"

@@ -8,16 +8,21 @@
 //
 //   free block   | next block of the list | next list (first block of a list of the process) | ...
 //
-// Chunks are never given back: memory that a large result needed once stays ready for the next one.
+// Chunks are given back on request only: memory that a large result needed once stays ready for the
+// next one.
 // Under a sanitizer every block comes from malloc, so that it sees each of them.
 #include "xquery/Object.h"
 
 #include "Platform/Base/WorkMeter.h"
+#include "xquery/Memory.h"
 
 #include <algorithm>
 #include <cstdlib>
+#include <iterator>
+#include <malloc.h>
 #include <mutex>
 #include <new>
+#include <vector>
 
 namespace xquery {
 
@@ -104,20 +109,22 @@ void giveRemainder(size_t size) {
   threadState.chunkLeft -= size;
 }
 
-// Gives everything a thread holds to the process when the thread ends.
-struct ThreadExit {
-  ~ThreadExit() {
-    for (size_t index = 0; index < sizeCount; ++index) {
-      BlockList& blocks = threadState.lists[index];
-      if (blocks.first) giveList(index, blocks.first);
-      if (blocks.reserve) giveList(index, blocks.reserve);
-      blocks = BlockList();
-    }
-    // The rest of the chunk becomes blocks of the largest size that fits.
-    while (threadState.chunkLeft >= granule) {
-      giveRemainder(std::min(threadState.chunkLeft, largestBlock));
-    }
+// Gives everything the thread holds to the process.
+void giveAll() {
+  for (size_t index = 0; index < sizeCount; ++index) {
+    BlockList& blocks = threadState.lists[index];
+    if (blocks.first) giveList(index, blocks.first);
+    if (blocks.reserve) giveList(index, blocks.reserve);
+    blocks = BlockList();
   }
+  // The rest of the chunk becomes blocks of the largest size that fits.
+  while (threadState.chunkLeft >= granule) {
+    giveRemainder(std::min(threadState.chunkLeft, largestBlock));
+  }
+}
+
+struct ThreadExit {
+  ~ThreadExit() { giveAll(); }
 };
 
 void closeAtThreadExit() {
@@ -192,6 +199,101 @@ void carveBlocks(size_t sizeIndex) {
   blocks.length = 0;
 }
 
+// What was handed to the process, taken out of its hands to give back the chunks of which every
+// block is idle. A block that some thread uses, keeps in its own lists or has not carved yet keeps
+// its chunk; nobody else touches the others meanwhile.
+class IdleBlocks {
+ public:
+  IdleBlocks() {
+    SharedLists& shared = sharedLists();
+    const std::lock_guard<std::mutex> guard(shared.mutex);
+    for (void* chunk = shared.chunks; chunk; chunk = *static_cast<void**>(chunk)) {
+      _chunks.push_back({static_cast<unsigned char*>(chunk), granule});
+    }
+    std::sort(_chunks.begin(), _chunks.end(),
+              [](const Chunk& a, const Chunk& b) { return a.first < b.first; });
+    std::swap_ranges(std::begin(_lists), std::end(_lists), std::begin(shared.lists));
+  }
+
+  void giveBack() {
+    forEachBlock([this](size_t index, FreeBlock* block) {
+      chunkOf(block)->idleBytes += (index + 1) * granule;
+    });
+    forEachBlock([this](size_t index, FreeBlock* block) {
+      if (!isIdle(*chunkOf(block))) keep(index, block);
+    });
+    for (size_t index = 0; index < sizeCount; ++index) {
+      if (_kept[index].first) giveList(index, _kept[index].first);
+    }
+    unchain();
+    for (const Chunk& chunk : _chunks) {
+      if (isIdle(chunk)) std::free(chunk.first);
+    }
+  }
+
+ private:
+  struct Chunk {
+    unsigned char* first;
+    size_t idleBytes;  // with the word that chains it
+  };
+
+  static bool isIdle(const Chunk& chunk) { return chunk.idleBytes == chunkBytes; }
+
+  template <class Work>
+  void forEachBlock(Work work) {
+    for (size_t index = 0; index < sizeCount; ++index) {
+      for (FreeBlock* list = _lists[index]; list;) {
+        FreeBlock* const nextList = list->nextList;
+        for (FreeBlock* block = list; block;) {
+          FreeBlock* const next = block->next;
+          work(index, block);
+          block = next;
+        }
+        list = nextList;
+      }
+    }
+  }
+  // Null for what is in none of those that were there at the start.
+  Chunk* chunkOf(const void* block) {
+    const auto after = std::upper_bound(
+        _chunks.begin(), _chunks.end(), static_cast<const unsigned char*>(block),
+        [](const unsigned char* wanted, const Chunk& chunk) { return wanted < chunk.first; });
+    if (after == _chunks.begin()) return nullptr;
+    Chunk& chunk = *std::prev(after);
+    return block < chunk.first + chunkBytes ? &chunk : nullptr;
+  }
+  void keep(size_t index, FreeBlock* block) {
+    BlockList& kept = _kept[index];
+    if (kept.length == listLength) {
+      giveList(index, kept.first);
+      kept = BlockList();
+    }
+    block->next = kept.first;
+    kept.first = block;
+    ++kept.length;
+  }
+  // Takes what is given back out of the chain, to which chunks may have been added meanwhile.
+  void unchain() {
+    SharedLists& shared = sharedLists();
+    const std::lock_guard<std::mutex> guard(shared.mutex);
+    void* kept = nullptr;
+    for (void* chunk = shared.chunks; chunk;) {
+      void* const next = *static_cast<void**>(chunk);
+      const Chunk* known = chunkOf(chunk);
+      if (!known || !isIdle(*known)) {
+        *static_cast<void**>(chunk) = kept;
+        kept = chunk;
+      }
+      chunk = next;
+    }
+    shared.chunks = kept;
+  }
+
+  std::vector<Chunk> _chunks;
+  FreeBlock* _lists[sizeCount] = {};
+  BlockList _kept[sizeCount];
+};
+
 bool pushPending(const NSCounted* object) {
   PendingObjects& pending = threadState.pending;
   if (pending.count == pending.capacity) {
@@ -252,6 +354,18 @@ void NSCounted::destroy(const NSCounted* object) {
     pending = PendingObjects();
   }
   --state.destructionDepth;
+}
+
+void XQueryReleaseIdleMemory() {
+  giveAll();
+  try {
+    IdleBlocks().giveBack();
+  } catch (const std::bad_alloc&) {
+    // Not even the list of what there is; the rest can still go.
+  }
+#ifdef __GLIBC__
+  ::malloc_trim(0);
+#endif
 }
 
 }  // namespace xquery

@@ -1,12 +1,16 @@
 #include "xquery/Collection.h"
+#include "xquery/Memory.h"
 #include "xquery/Number.h"
 #include "xquery/Object.h"
 
 #include <gtest/gtest.h>
 
 #include <array>
+#include <atomic>
+#include <fstream>
 #include <set>
 #include <thread>
+#include <unistd.h>
 #include <vector>
 
 namespace xquery {
@@ -170,6 +174,85 @@ TEST(Object, KindTestsAcceptNull) {
   EXPECT_TRUE(isa<NSArray>(array));
   EXPECT_FALSE(isa<NSNumber>(array));
   EXPECT_EQ(dyn_cast<NSNumber>(array), nullptr);
+}
+
+// --- idle memory ---------------------------------------------------------------------------------
+
+#if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+
+size_t residentBytes() {
+  std::ifstream file("/proc/self/statm");
+  size_t all = 0, resident = 0;
+  file >> all >> resident;
+  return resident * static_cast<size_t>(::sysconf(_SC_PAGESIZE));
+}
+
+// Ends with nothing in use.
+void makeMany(int64_t count) {
+  std::vector<Value> values;
+  values.reserve(static_cast<size_t>(count));
+  for (int64_t index = 0; index < count; ++index) {
+    values.push_back(NSNumber::numberWithLongLong(index));
+  }
+}
+
+constexpr int64_t manyNumbers = 1000000;
+constexpr size_t mostOfTheirBytes = manyNumbers * sizeof(NSNumber) * 3 / 4;
+
+TEST(Object, IdleMemoryIsGivenBackOnRequest) {
+  makeMany(manyNumbers);
+  const size_t before = residentBytes();
+  XQueryReleaseIdleMemory();
+  EXPECT_LT(residentBytes() + mostOfTheirBytes, before);
+}
+
+TEST(Object, SoIsWhatAThreadThatEndedLeft) {
+  std::thread([] { makeMany(manyNumbers); }).join();
+  const size_t before = residentBytes();
+  XQueryReleaseIdleMemory();
+  EXPECT_LT(residentBytes() + mostOfTheirBytes, before);
+}
+
+#endif
+
+TEST(Object, GivingMemoryBackTouchesNothingInUse) {
+  std::vector<Ref<Sized<40>>> kept;
+  for (int round = 0; round < 5; ++round) {
+    std::vector<Ref<Sized<40>>> objects;
+    for (int index = 0; index < 20000; ++index) {
+      objects.push_back(make<Sized<40>>(static_cast<unsigned char>(index)));
+    }
+    for (size_t index = 0; index < objects.size(); index += 500) kept.push_back(objects[index]);
+    objects.clear();
+    XQueryReleaseIdleMemory();
+    for (size_t index = 0; index < kept.size(); ++index) {
+      ASSERT_TRUE(kept[index]->holds(static_cast<unsigned char>(index % 40 * 500)));
+    }
+  }
+  kept.clear();
+  EXPECT_EQ(livingObjects, 0);
+}
+
+TEST(Object, MemoryIsGivenBackWhileOthersWork) {
+  std::atomic<bool> done = false;
+  std::vector<std::thread> workers;
+  for (int worker = 0; worker < 2; ++worker) {
+    workers.emplace_back([&done] {
+      do {
+        std::vector<Value> values;
+        for (int64_t index = 0; index < 20000; ++index) {
+          values.push_back(NSNumber::numberWithLongLong(index));
+        }
+        for (int64_t index = 0; index < 20000; ++index) {
+          const Value& value = values[static_cast<size_t>(index)];
+          ASSERT_EQ(cast<NSNumber>(value)->longLongValue(), index);
+        }
+      } while (!done);
+    });
+  }
+  for (int times = 0; times < 50; ++times) XQueryReleaseIdleMemory();
+  done = true;
+  for (std::thread& worker : workers) worker.join();
 }
 
 }  // namespace
