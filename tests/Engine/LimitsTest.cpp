@@ -107,6 +107,24 @@ const std::vector<Work>& longWork() {
       {"CastingText", megabytes + "for $k in 1 to 1000000 return ($s castable as xs:integer, "
                                   "$s castable as xs:NCName, $s castable as xs:hexBinary, "
                                   "$s castable as xs:base64Binary, $s castable as xs:token)"},
+      {"CastingTextToURI",
+       megabytes + "let $p := translate($s, '0123456789abcdef', '////////////////') "
+                   "for $k in 1 to 1000000 return ($s castable as xs:anyURI, "
+                   "$p castable as xs:anyURI, string-length(string(resolve-uri($p, "
+                   "'http://h/a'))), string-length(string(resolve-uri($s, 'http://h/a'))))"},
+      {"CastingDigits",
+       megabytes + "let $n := translate($s, 'abcdef', '012345') for $k in 1 to 1000000 return "
+                   "(number($n), $n castable as xs:decimal, $n castable as xs:date, "
+                   "concat('12:00:00.', $n) castable as xs:time, number(translate($s, "
+                   "'0123456789abcdef', ' ')), concat('PT', $n, 'S') castable as xs:duration)"},
+      {"LowerCaseOfSigmas", megabytes +
+                                "let $w := translate($s, '0123456789abcdef', "
+                                "'&#931;&#931;&#931;&#931;&#931;&#931;&#931;&#931;::::::::') "
+                                "for $k in 1 to 1000000 return count(lower-case($w))"},
+      {"JoiningWideText",
+       megabytes + "let $w := translate($s, '9', '&#233;') for $k in 1 to 1000000 return "
+                   "count((concat($s, $w), string-join(($s, $w, $s), $w), "
+                   "ext:string-from-node(text {$w})))"},
       {"JoiningText",
        strings + "for $k in 1 to 1000000 return string-length(string-join($s, $t[1]))"},
       {"SearchingText", megabytes + "for $k in 1 to 1000000 return (contains($s, 'fe'), "
@@ -132,6 +150,13 @@ const std::vector<Work>& longWork() {
       {"Multiplying", digits + "for $k in 1 to 1000000 return count($n * $n)"},
       {"Dividing", digits + "for $k in 1 to 1000000 return count(($n * $n) idiv $n)"},
       {"Digits", digits + "for $k in 1 to 1000000 return count(xs:decimal(string($n)))"},
+      {"ComparingDigits", digits + "let $m := ($n + 1, $n + 0.1, $n - 0.01), $d := (1e5, $n) "
+                                   "for $k in 1 to 1000000 where $m = $d or $m < 1e5 return $k"},
+      {"SortingDigits", digits + "for $k in 1 to 1000000 return count(for $i in (1 to 20) order "
+                                 "by $n + $i * 0.001 return $i)"},
+      {"SearchingDigits",
+       digits + "let $m := for $i in 1 to 50 return $n + $i * 0.01 for $k in 1 to 1000000 return "
+                "(count(index-of($m, 1.5e0)), count(distinct-values(($m, 1e0))))"},
       {"Elements",
        "for $k in 1 to 1000000 return count(<a>{for $i in 1 to 100000 return "
        "<b c='{$i}'>{$i}</b>}</a>)"},
