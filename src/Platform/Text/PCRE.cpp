@@ -9,6 +9,7 @@
 #define PCRE2_CODE_UNIT_WIDTH 8
 #include "Platform/Text/PCRE.h"
 
+#include "Platform/Base/Stack.h"
 #include "Platform/Base/ThreadClock.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/PCREClassicSyntax.h"
@@ -33,6 +34,9 @@ constexpr int64_t unitsPerLook = 2048;  // about a step of work
 constexpr size_t bytesPerUnit = 8;
 constexpr int64_t unitsPerSearch = 16;
 constexpr int64_t unitsPerBackReference = 8;
+
+// Compiling recurses with the nesting of groups, of which 250 levels are allowed.
+constexpr size_t compilingStack = size_t{512} << 10;
 
 constexpr double mostSeconds = 0.5;
 constexpr double mostSecondsPerByte = 16e-6;
@@ -164,8 +168,10 @@ class Compiler {
 
   void attempt() {
     const uint32_t options = _options | (_callouts ? PCRE2_AUTO_CALLOUT : 0);
-    _code.reset(pcre2_compile(bytes(_pattern), _pattern.size(), options, &_error, &_offset,
-                              _context.get()));
+    withStack(compilingStack, [&] {
+      _code.reset(pcre2_compile(bytes(_pattern), _pattern.size(), options, &_error, &_offset,
+                                _context.get()));
+    });
   }
 
   std::string_view _pattern;
@@ -238,7 +244,7 @@ struct PCREPattern::Code {
   void translateFor(size_t subjectBytes) {
     if (!translated && (used || subjectBytes >= longSubject)) {
       // Without machine code the library interprets, so a failure needs no care.
-      pcre2_jit_compile(code.get(), PCRE2_JIT_COMPLETE);
+      withStack(compilingStack, [&] { pcre2_jit_compile(code.get(), PCRE2_JIT_COMPLETE); });
       translated = true;
     }
     used = true;

@@ -1,4 +1,5 @@
 #include "Platform/Base/ProcessorTime.h"
+#include "Platform/Base/StackTestSupport.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/PCRE.h"
 #include "Platform/Text/TextTestSupport.h"
@@ -41,6 +42,19 @@ TEST(PCRE, FindsTheFirstMatchAndItsGroups) {
   EXPECT_EQ(search("(x)?b(c)", "abcbc"), "1-3 - 2-3");
   EXPECT_EQ(search("z", "abc"), "none");
   EXPECT_EQ(search("", ""), "0-0");
+}
+
+TEST(PCRE, ASmallStackIsEnoughForNestedGroups) {
+  const std::string nested = std::string(249, '(') + "b" + std::string(249, ')');
+  const std::string longSubject = std::string(100000, 'a') + "b";
+  const std::string found = search(nested, "abc");
+  const std::string foundInLong = search(nested, longSubject);
+  EXPECT_NE(found, "bad pattern");
+  onStack(size_t{96} << 10, [&] {
+    EXPECT_EQ(search(nested, "abc"), found);
+    EXPECT_EQ(search(nested, longSubject), foundInLong) << "translated";
+    EXPECT_EQ(search(std::string(300, '(') + std::string(300, ')'), "a"), "bad pattern");
+  });
 }
 
 TEST(PCRE, OffsetsAreBytes) {
