@@ -1,6 +1,7 @@
 #include "Platform/Reading/LibXML.h"
 
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/MarkupMeter.h"
 
 #include <libxml/parser.h>
 #include <libxml/parserInternals.h>
@@ -15,6 +16,8 @@
 #include <memory>
 #include <mutex>
 #include <new>
+#include <unordered_map>
+#include <utility>
 
 namespace xquery {
 
@@ -47,7 +50,13 @@ class Parse {
   void note(const char* message, int64_t line, int64_t column);  // the first failure counts
   void end(std::exception_ptr exception);                        // counts as a failure
   bool hasReadAll();
-  bool isTagTooLong() const;
+  size_t position() const;  // of the parser, in the document's text
+  void hasEvent();
+  void measureInput();
+  const char* excess(const MarkupMeter& meter) const;
+  void measureEntity(const xmlEntity& entity);
+  void hasDeclaration(size_t listed);
+  void chargeTag(size_t namespaces, size_t attributes);
   bool mayAdd(size_t bytes);
   bool mayAddDefaults(const LibXMLNamespaces& namespaces, const LibXMLAttributes& attributes,
                       int defaultedCount);
@@ -58,12 +67,17 @@ class Parse {
   static void startDocument(void* self);
   static void internalSubset(void* self, const xmlChar* name, const xmlChar* publicID,
                              const xmlChar* systemID);
+  static void elementDecl(void* self, const xmlChar*, int, xmlElementContent*);
+  static void attributeDecl(void* self, const xmlChar* element, const xmlChar*, int, int kind,
+                            const xmlChar* value, xmlEnumeration* tokens);
+  static void notationDecl(void* self, const xmlChar*, const xmlChar*, const xmlChar*);
   static void entityDecl(void* self, const xmlChar* name, int type, const xmlChar* publicID,
                          const xmlChar* systemID, xmlChar* content);
   static void unparsedEntityDecl(void* self, const xmlChar* name, const xmlChar* publicID,
                                  const xmlChar* systemID, const xmlChar* notation);
   static xmlEntityPtr getEntity(void* self, const xmlChar* name);
   static xmlEntityPtr getParameterEntity(void* self, const xmlChar* name);
+  bool isDeclaring(const xmlChar* name);
   xmlEntityPtr permitted(xmlEntityPtr entity);
   static void startElement(void* self, const xmlChar* localName, const xmlChar* prefix,
                            const xmlChar* URI, int namespaceCount, const xmlChar** namespaces,
@@ -84,7 +98,12 @@ class Parse {
   xmlParserCtxt* _parser = nullptr;
   size_t _bytesRead = 0;
   size_t _bytesAdded = 0;
-  int _namespaceEntries = 0;  // of the parser's, before the tag at hand
+  MarkupMeter _meter;                  // of what came since the last event
+  size_t _measuredTo = 0;              // the place in the document's text
+  const xmlChar* _declared = nullptr;  // the entity, until it is asked for
+  size_t _listedInEntities = 0;        // since the last declaration
+  size_t _attributesDeclared = 0;
+  std::unordered_map<LibXMLText, size_t> _defaults;  // of the elements
   bool _reachedEnd = false;
   bool _failed = false;
   std::exception_ptr _ended;
@@ -92,6 +111,7 @@ class Parse {
 
 constexpr const char* outOfMemory = "out of memory";
 constexpr size_t bytesPerStep = 1024;
+constexpr size_t comparisonsPerStep = 10'000;
 constexpr const char* tooMuchText = "entities expand to too much text";
 
 std::string_view viewOf(const xmlChar* text, size_t length) {
@@ -180,12 +200,13 @@ void Parse::hearError(void*, xmlError* error) {
 void Parse::hearText(void*, const char*, ...) {}
 
 void Parse::hear(const xmlError& error) {
-  // Neither warnings, for example of a namespace URI that is relative, nor breaches of validity and
-  // of good sense, for example a token that an enumeration has twice or a predefined entity
-  // declared otherwise, make a document bad.
-  const bool isMinor = error.level < XML_ERR_FATAL &&
-                       (error.level < XML_ERR_ERROR || error.domain == XML_FROM_DTD ||
-                        error.domain == XML_FROM_VALID || error.domain == XML_FROM_TREE);
+  // Neither warnings, of URIs that are relative or none, nor breaches of validity and of good
+  // sense, for example a token that an enumeration has twice or a predefined entity declared
+  // otherwise, make a document bad.
+  const bool isMinor = error.level < XML_ERR_ERROR || error.code == XML_WAR_NS_URI ||
+                       (error.level < XML_ERR_FATAL &&
+                        (error.domain == XML_FROM_DTD || error.domain == XML_FROM_VALID ||
+                         error.domain == XML_FROM_TREE));
   if (_failed || isMinor) return;
   // What concerns the input is heard while it is read, when the parser cannot be stopped.
   const bool isOfInput = error.domain != XML_FROM_PARSER && error.domain != XML_FROM_NAMESPACE;
@@ -214,21 +235,71 @@ int Parse::readInput(void* self, char* buffer, int size) {
     parse.note("the input cannot be read", 0, 0);
     return 0;
   }
-  if (parse.isTagTooLong()) {
-    const xmlParserInput* input = parse._parser->input;
-    parse.note("too many attributes", input->line, input->col);
-    return 0;
-  }
+  parse.measureInput();
+  if (parse._failed) return 0;
   if (count == 0) parse._reachedEnd = true;
   parse._bytesRead += static_cast<size_t>(count);
   return static_cast<int>(count);
 }
 
-// Looked at whenever input is read, which is often within a long tag. The room for attributes is
-// five entries for each and doubles; namespaces are two entries each.
-bool Parse::isTagTooLong() const {
-  return _parser->maxatts > 2 * 5 * LibXMLMostAttributes ||
-         _parser->nsNr - _namespaceEntries > 2 * LibXMLMostAttributes;
+// The parser holds the text from `base` on; before that it has consumed some. While it waits for
+// more its own pointers may be stale, but what is between them is right.
+size_t Parse::position() const {
+  const xmlParserInput* input = _parser->inputNr > 0 ? _parser->inputTab[0] : nullptr;
+  return input ? input->consumed + static_cast<size_t>(input->cur - input->base) : 0;
+}
+
+// What came up to here is done with.
+void Parse::hasEvent() {
+  _measuredTo = position();
+  _meter.restart(isInsideDTD() ? MarkupMeter::Place::Declaration : MarkupMeter::Place::Content);
+}
+
+// Where the parser is, if not in markup that began before.
+MarkupMeter::Place placeOf(const xmlParserCtxt& parser) {
+  switch (parser.instate) {
+    case XML_PARSER_COMMENT:
+      return MarkupMeter::Place::Comment;
+    case XML_PARSER_PI:
+      return MarkupMeter::Place::Instruction;
+    case XML_PARSER_CDATA_SECTION:
+      return MarkupMeter::Place::Section;
+    case XML_PARSER_DTD:
+      return MarkupMeter::Place::Declaration;
+    case XML_PARSER_START_TAG:
+    case XML_PARSER_CONTENT:
+      return MarkupMeter::Place::Content;
+    default:
+      return MarkupMeter::Place::Beyond;
+  }
+}
+
+// Whenever input is read, which is often within anything long, measures what came before. The
+// parser may have let go of some of that; it never does so within tags and lists.
+void Parse::measureInput() {
+  const xmlParserInput* input = _parser->inputNr > 0 ? _parser->inputTab[0] : nullptr;
+  if (!input || !input->buf) return;
+  const size_t held = xmlBufUse(input->buf->buffer);
+  const auto* text = reinterpret_cast<const char*>(xmlBufContent(input->buf->buffer));
+  if (_measuredTo < input->consumed) {
+    _measuredTo = position();
+    _meter.restart(placeOf(*_parser));
+  }
+  const size_t start = std::min(_measuredTo - input->consumed, held);
+  _meter.read({text + start, held - start});
+  _measuredTo = input->consumed + held;
+  if (const char* message = excess(_meter)) note(message, input->line, input->col);
+}
+
+const char* Parse::excess(const MarkupMeter& meter) const {
+  const auto namespaces = static_cast<size_t>(_parser->nsNr) / 2;
+  if (meter.mostAttributes() > LibXMLMostAttributes) return "too many attributes";
+  if (namespaces > LibXMLMostNamespaces) return "too many namespaces";
+  if (meter.mostAttributes() * namespaces > LibXMLMostLookups) return "too many namespaces";
+  if (meter.mostListed() + _listedInEntities > LibXMLMostListed) {
+    return "too many names in a declaration";
+  }
+  return nullptr;
 }
 
 // libxml2 takes a zero byte after the root element for the end of the input.
@@ -269,18 +340,74 @@ xmlEntityPtr Parse::permitted(xmlEntityPtr entity) {
   guarded([&] {
     if (!mayAdd(bytes)) throw LibXMLStop{tooMuchText};
     checkWork(bytes / bytesPerStep + 1);
+    measureEntity(*entity);
   });
   return _failed ? nullptr : entity;
 }
 
+// The text of an entity is parsed without reading anything. Lists of several entities may stand in
+// one declaration.
+void Parse::measureEntity(const xmlEntity& entity) {
+  const bool isParameter = entity.etype == XML_INTERNAL_PARAMETER_ENTITY;
+  MarkupMeter meter(isParameter ? MarkupMeter::Place::Declaration : MarkupMeter::Place::Content);
+  meter.read(viewOf(entity.content, static_cast<size_t>(entity.length)));
+  if (const char* message = excess(meter)) throw LibXMLStop{message};
+  if (isParameter) _listedInEntities += meter.mostListed();
+  // A parser of its own reads it, which is told all namespaces in scope.
+  chargeTag(0, 1);
+}
+
 xmlEntityPtr Parse::getEntity(void* self, const xmlChar* name) {
   Parse& parse = of(self);
-  return parse._failed ? nullptr : parse.permitted(xmlSAX2GetEntity(parse._parser, name));
+  if (parse._failed) return nullptr;
+  xmlEntity* const entity = xmlSAX2GetEntity(parse._parser, name);
+  return parse.isDeclaring(name) ? entity : parse.permitted(entity);
 }
 
 xmlEntityPtr Parse::getParameterEntity(void* self, const xmlChar* name) {
   Parse& parse = of(self);
-  return parse._failed ? nullptr : parse.permitted(xmlSAX2GetParameterEntity(parse._parser, name));
+  if (parse._failed) return nullptr;
+  xmlEntity* const entity = xmlSAX2GetParameterEntity(parse._parser, name);
+  return parse.isDeclaring(name) ? entity : parse.permitted(entity);
+}
+
+// What has just declared an entity with a text asks for it once, which is no use of it.
+bool Parse::isDeclaring(const xmlChar* name) {
+  return name == std::exchange(_declared, nullptr);
+}
+
+// --- declarations ----------------------------------------------------------------------------
+
+// Every one is an end of what may grow without an event.
+void Parse::hasDeclaration(size_t listed) {
+  hasEvent();
+  _listedInEntities = 0;
+  guarded([&] { checkWork(1 + listed * listed / comparisonsPerStep); });
+}
+
+// The content is libxml2's to free, the tokens are not.
+void Parse::elementDecl(void* self, const xmlChar*, int, xmlElementContent*) {
+  of(self).hasDeclaration(0);
+}
+
+void Parse::attributeDecl(void* self, const xmlChar* element, const xmlChar*, int, int,
+                          const xmlChar* value, xmlEnumeration* tokens) {
+  Parse& parse = of(self);
+  size_t listed = 0;
+  for (const xmlEnumeration* token = tokens; token; token = token->next) ++listed;
+  xmlFreeEnumeration(tokens);
+  parse.hasDeclaration(listed);
+  parse.guarded([&] {
+    const bool isTooMany = ++parse._attributesDeclared > LibXMLMostAttributesDeclared;
+    const bool isDefaultTooMany = value && ++parse._defaults[element] > LibXMLMostAttributes;
+    if (isTooMany || isDefaultTooMany) throw LibXMLStop{"too many attributes declared"};
+    // Where libxml2 keeps them, what has the same hash is searched one by one.
+    checkWork(1 + parse._attributesDeclared / comparisonsPerStep);
+  });
+}
+
+void Parse::notationDecl(void* self, const xmlChar*, const xmlChar*, const xmlChar*) {
+  of(self).hasDeclaration(0);
 }
 
 // libxml2 keeps the declared entities in a document of its own, which holds nothing else.
@@ -291,16 +418,20 @@ void Parse::startDocument(void* self) {
 void Parse::internalSubset(void* self, const xmlChar* name, const xmlChar* publicID,
                            const xmlChar* systemID) {
   xmlSAX2InternalSubset(of(self)._parser, name, publicID, systemID);
+  of(self).hasEvent();
 }
 
 void Parse::entityDecl(void* self, const xmlChar* name, int type, const xmlChar* publicID,
                        const xmlChar* systemID, xmlChar* content) {
   xmlSAX2EntityDecl(of(self)._parser, name, type, publicID, systemID, content);
+  of(self).hasDeclaration(0);
+  of(self)._declared = content ? name : nullptr;
 }
 
 void Parse::unparsedEntityDecl(void* self, const xmlChar* name, const xmlChar* publicID,
                                const xmlChar* systemID, const xmlChar* notation) {
   xmlSAX2UnparsedEntityDecl(of(self)._parser, name, publicID, systemID, notation);
+  of(self).hasDeclaration(0);
 }
 
 // Called for what was not substituted: leaving it out would lose text in silence.
@@ -311,44 +442,61 @@ void Parse::reference(void* self, const xmlChar*) {
 
 // --- content ---------------------------------------------------------------------------------
 
+void Parse::chargeTag(size_t namespaces, size_t attributes) {
+  const auto inScope = static_cast<size_t>(_parser->nsNr) / 2;
+  const size_t comparisons =
+      (namespaces * namespaces + attributes * attributes) / 2 + inScope * (1 + attributes);
+  checkWork(1 + comparisons / comparisonsPerStep);
+}
+
 void Parse::startElement(void* self, const xmlChar* localName, const xmlChar* prefix,
                          const xmlChar* URI, int namespaceCount, const xmlChar** namespaces,
                          int attributeCount, int defaultedCount, const xmlChar** attributes) {
   Parse& parse = of(self);
   const LibXMLNamespaces declared(namespaces, namespaceCount);
   const LibXMLAttributes given(attributes, attributeCount);
-  parse._namespaceEntries = parse._parser->nsNr;
+  parse.hasEvent();
   parse.guarded([&] {
     if (!parse.mayAddDefaults(declared, given, defaultedCount)) throw LibXMLStop{tooMuchText};
-    checkWork();
+    parse.chargeTag(static_cast<size_t>(namespaceCount), static_cast<size_t>(attributeCount));
     parse._handler.startElement({localName, prefix, URI}, declared, given);
   });
 }
 
 void Parse::endElement(void* self, const xmlChar*, const xmlChar*, const xmlChar*) {
   Parse& parse = of(self);
+  parse.hasEvent();
   parse.guarded([&] { parse._handler.endElement(); });
 }
 
 void Parse::characters(void* self, const xmlChar* text, int length) {
   Parse& parse = of(self);
+  parse.hasEvent();
   parse.guarded([&] { parse._handler.characters(viewOf(text, static_cast<size_t>(length))); });
 }
 
 void Parse::CDATABlock(void* self, const xmlChar* text, int length) {
   Parse& parse = of(self);
+  parse.hasEvent();
   parse.guarded([&] { parse._handler.CDATA(viewOf(text, static_cast<size_t>(length))); });
 }
 
 void Parse::comment(void* self, const xmlChar* text) {
   Parse& parse = of(self);
-  if (!parse.isInsideDTD()) parse.guarded([&] { parse._handler.comment(viewOf(text)); });
+  parse.hasEvent();
+  parse.guarded([&] {
+    checkWork();
+    if (!parse.isInsideDTD()) parse._handler.comment(viewOf(text));
+  });
 }
 
 void Parse::processingInstruction(void* self, const xmlChar* target, const xmlChar* text) {
   Parse& parse = of(self);
-  if (parse.isInsideDTD()) return;
-  parse.guarded([&] { parse._handler.processingInstruction(target, viewOf(text)); });
+  parse.hasEvent();
+  parse.guarded([&] {
+    checkWork();
+    if (!parse.isInsideDTD()) parse._handler.processingInstruction(target, viewOf(text));
+  });
 }
 
 xmlSAXHandler Parse::callbacks() {
@@ -357,6 +505,9 @@ xmlSAXHandler Parse::callbacks() {
   handler.initialized = XML_SAX2_MAGIC;
   handler.startDocument = startDocument;
   handler.internalSubset = internalSubset;
+  handler.elementDecl = elementDecl;
+  handler.attributeDecl = attributeDecl;
+  handler.notationDecl = notationDecl;
   handler.entityDecl = entityDecl;
   handler.unparsedEntityDecl = unparsedEntityDecl;
   handler.getEntity = getEntity;

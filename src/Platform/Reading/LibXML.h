@@ -86,13 +86,25 @@ constexpr size_t LibXMLAddedFactor = 20;
 constexpr size_t LibXMLReferenceCost = 32;
 constexpr size_t LibXMLAttributeCost = 16;
 
-// libxml2 compares every attribute of a start tag with every other, and every declaration too, and
-// cannot be interrupted meanwhile: a tag of a million would keep it busy for minutes. Somewhat more
-// than this many are refused: twenty milliseconds of work, so that an evaluation which is told to
-// end while a document is read ends within its tenth of a second on a slow machine too.
-constexpr int LibXMLMostAttributes = 6000;
+// libxml2 compares every attribute of a start tag with every other, every declaration too, and the
+// names of a list in a declaration; it looks prefixes up among all namespaces in scope, and tables
+// of its own stop growing long before what is in them does. It cannot be interrupted meanwhile: a
+// tag of a million attributes would keep it busy for minutes. More than these are refused before
+// that work begins, or where it has gone on for some tens of milliseconds, so that an evaluation
+// which is told to end while a document is read ends within its tenth of a second on a slow machine
+// too.
+constexpr size_t LibXMLMostAttributes = 6'000;           // of a tag, or with defaults of an element
+constexpr size_t LibXMLMostListed = 6'000;               // names in a list
+constexpr size_t LibXMLMostAttributesDeclared = 10'000;  // by one document
+constexpr size_t LibXMLMostNamespaces = 250'000;         // in scope
+constexpr size_t LibXMLMostLookups = 50'000'000;         // attributes of a tag, times namespaces
 
-// Whether the document was well formed; else `error` says what is wrong, and where.
+// libxml2 recurses with the nesting of content models and entities, a thousand levels and more: the
+// stack that it is given.
+constexpr size_t LibXMLStackBytes = size_t{2} << 20;
+
+// Whether the document was well formed; else `error` says what is wrong, and where. Needs a stack
+// of LibXMLStackBytes.
 bool parseWithLibXML(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error);
 
 }  // namespace xquery

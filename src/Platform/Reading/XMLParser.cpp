@@ -4,6 +4,7 @@
 // 8-bit if it can be, and becomes a text node unless it is white space that is not to be kept.
 // Names are looked up by the addresses of libxml2's texts, which are equal for equal names within
 // one document, so that the process's table of names is asked once per name and document.
+#include "Platform/Base/Stack.h"
 #include "Platform/Reading/LibXML.h"
 #include "Platform/Reading/Tidy.h"
 #include "Platform/Text/UTF8.h"
@@ -306,9 +307,12 @@ void TreeHandler::processingInstruction(LibXMLText target, std::string_view text
 
 Ref<NSXMLDocument> parse(const LibXMLReader& read, uint32_t options, size_t expectedBytes,
                          NSXMLParseError& error) {
-  TreeHandler handler(options, expectedBytes);
-  if (!parseWithLibXML(read, handler, error)) return nullptr;
-  return handler.finish();
+  Ref<NSXMLDocument> document;
+  withStack(LibXMLStackBytes, [&] {
+    TreeHandler handler(options, expectedBytes);
+    if (parseWithLibXML(read, handler, error)) document = handler.finish();
+  });
+  return document;
 }
 
 Ref<NSXMLDocument> parseHTML(std::string_view bytes, uint32_t options, NSXMLParseError& error) {

@@ -7,6 +7,7 @@
 #include <gtest/gtest.h>
 #include <libxml/xmlerror.h>
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -227,6 +228,107 @@ TEST(XMLDeclarations, TextThatItsEncodingDoesNotKnowIsAnError) {
   EXPECT_FALSE(NSXMLDocument::documentWithData(
       "<?xml version='1.0' encoding='EUC-JP'?><a>\xFF\xFF\xFF</a>", 0, &error));
   EXPECT_NE(error.message.find("input conversion failed"), std::string::npos) << error.message;
+}
+
+// --- sizes ---------------------------------------------------------------------------------------
+
+std::string repeated(size_t count, const std::function<std::string(size_t)>& part,
+                     const char* separator = "") {
+  std::string text;
+  for (size_t index = 0; index < count; ++index) {
+    if (index > 0) text += separator;
+    text += part(index);
+  }
+  return text;
+}
+
+std::string name(size_t index) {
+  return "n" + std::to_string(index);
+}
+
+std::string names(size_t count, const char* separator, size_t first = 0) {
+  return repeated(
+      count, [=](size_t index) { return name(first + index); }, separator);
+}
+
+std::string inEntity(const std::string& declaration) {
+  return "<!ENTITY % p \"" + declaration + "\">%p;";
+}
+
+struct Sized {
+  const char* what;
+  std::function<std::string(size_t)> subset;
+  size_t most;  // thereabouts
+  const char* failure;
+};
+
+const std::vector<Sized> sizes = {
+    {"tokens", [](size_t n) { return "<!ATTLIST a x (" + names(n, "|") + ") #IMPLIED>"; },
+     LibXMLMostListed, "too many names in a declaration"},
+    {"notations",
+     [](size_t n) { return "<!ATTLIST a x NOTATION (" + names(n, "|") + ") #IMPLIED>"; },
+     LibXMLMostListed, "too many names in a declaration"},
+    {"names of a sequence", [](size_t n) { return "<!ELEMENT a (" + names(n, " , ") + ")>"; },
+     LibXMLMostListed, "too many names in a declaration"},
+    {"names of mixed content",
+     [](size_t n) { return "<!ELEMENT a (#PCDATA|" + names(n, "|") + ")*>"; }, LibXMLMostListed,
+     "too many names in a declaration"},
+    {"defaults",
+     [](size_t n) {
+       return "<!ATTLIST a " + repeated(n, [](size_t i) { return name(i) + " CDATA 'v' "; }) + ">";
+     },
+     LibXMLMostAttributes, "too many attributes declared"},
+    {"attribute lists",
+     [](size_t n) {
+       return repeated(n, [](size_t i) { return "<!ATTLIST " + name(i) + " x CDATA 'v'>"; });
+     },
+     LibXMLMostAttributesDeclared, "too many attributes declared"},
+};
+
+std::string errorOf(const std::string& text) {
+  NSXMLParseError error;
+  return NSXMLDocument::documentWithData(text, 0, &error) ? "" : error.message;
+}
+
+TEST(XMLDeclarations, WhatIsComparedWithEachOtherIsBounded) {
+  for (const Sized& size : sizes) {
+    EXPECT_EQ(errorOf(withSubset(size.subset(size.most - 10))), "") << size.what;
+    // What has been read at the end is not measured any more.
+    const std::string tooMuch = size.subset(size.most + 2000);
+    EXPECT_EQ(errorOf(withSubset(tooMuch)), size.failure) << size.what;
+    EXPECT_EQ(errorOf(withSubset(inEntity(tooMuch))), size.failure) << size.what;
+    EXPECT_EQ(errorOf(withSubset(inEntity(size.subset(size.most - 10)))), "") << size.what;
+  }
+}
+
+TEST(XMLDeclarations, AListOfSeveralEntitiesIsBoundedToo) {
+  std::string subset;
+  std::string uses;
+  for (size_t part = 0; part < 20; ++part) {
+    subset += "<!ENTITY % e" + std::to_string(part) + " '" + names(1000, "|", part * 1000) + "'>";
+    uses += (part ? "|&#37;e" : "&#37;e") + std::to_string(part) + ";";
+  }
+  subset += "<!ENTITY % p '<!ATTLIST a x (" + uses + ") #IMPLIED>'>%p;";
+  EXPECT_EQ(errorOf(withSubset(subset)), "too many names in a declaration");
+}
+
+TEST(XMLDeclarations, ManyShortOnesAreNot) {
+  const std::string subset = repeated(20000, [](size_t index) {
+    return "<!ELEMENT " + name(index) + " (a,b)><!ENTITY " + name(index) +
+           " 'text, of (a|b|c)'><!NOTATION " + name(index) + " SYSTEM 'x'><!-- | | | -->";
+  });
+  EXPECT_EQ(errorOf(withSubset(subset)), "");
+  EXPECT_EQ(errorOf(withSubset("<!ENTITY e '" + std::string(1 << 20, '|') + "'>")), "");
+  EXPECT_EQ(errorOf(withSubset("<!--" + std::string(1 << 20, ',') + "-->")), "");
+}
+
+TEST(XMLDeclarations, TheTagsOfAnEntityAreBounded) {
+  const auto withTag = [](size_t count) {
+    return "<!DOCTYPE a [<!ENTITY e \"<b " +
+           repeated(count, [](size_t index) { return name(index) + "='' "; }) + "/>\">]><a>&e;</a>";
+  };
+  EXPECT_EQ(errorOf(withTag(LibXMLMostAttributes)), "");
+  EXPECT_EQ(errorOf(withTag(LibXMLMostAttributes + 1)), "too many attributes");
 }
 
 }  // namespace

@@ -1,3 +1,4 @@
+#include "Platform/Base/StackTestSupport.h"
 #include "Platform/Loading/LoadingTestSupport.h"
 #include "Platform/Reading/LibXML.h"
 #include "Platform/Tree/Arena.h"
@@ -91,6 +92,12 @@ TEST(XMLParser, AttributeDefaultsOfTheInternalSubsetApply) {
   ASSERT_TRUE(a->attributeForName(A("x")));
   EXPECT_EQ(a->attributeForName(A("x"))->textView().utf8(), "dflt");
   EXPECT_EQ(a->attributeForName(A("y"))->textView().utf8(), "p q");
+}
+
+TEST(XMLParser, ANamespaceMayBeAnyText) {
+  const auto document = parsed("<p:a xmlns:p='two words' xmlns='%'><b/></p:a>");
+  EXPECT_EQ(document->rootElement()->URIView().utf8(), "two words");
+  EXPECT_EQ(document->rootElement()->firstChild()->URIView().utf8(), "%");
 }
 
 TEST(XMLParser, AttributesAndLineEndsAreNormalised) {
@@ -382,6 +389,66 @@ TEST(XMLParser, TheAttributesOfATagAreBounded) {
   EXPECT_TRUE(parsed(tagWith(5000, " xmlns:x")));
   EXPECT_EQ(errorOf(tagWith(150000, " x")).message, "too many attributes");
   EXPECT_EQ(errorOf(tagWith(150000, " xmlns:x")).message, "too many attributes");
+  EXPECT_TRUE(parsed("<a x='" + std::string(100000, '=') + "'/>")) << "one attribute";
+  EXPECT_TRUE(parsed("<a>" + std::string(100000, '=') + "</a>")) << "no attribute";
+}
+
+TEST(XMLParser, TheSearchForTheNamespacesOfATagIsBounded) {
+  // 24,000 declarations in scope, then a tag of many attributes.
+  std::string text;
+  for (int level = 0; level < 12; ++level) {
+    text += "<a";
+    for (int index = 0; index < 2000; ++index) {
+      text += " xmlns:p" + std::to_string(level) + "_" + std::to_string(index) + "='u'";
+    }
+    text += ">";
+  }
+  const auto closed = [&](int attributes) {
+    std::string tag = "<b";
+    for (int index = 0; index < attributes; ++index)
+      tag += " p0_0:x" + std::to_string(index) + "=''";
+    std::string ends;
+    for (int level = 0; level < 12; ++level) ends += "</a>";
+    return text + tag + "/>" + ends;
+  };
+  EXPECT_TRUE(parsed(closed(1000)));
+  EXPECT_EQ(errorOf(closed(3000)).message, "too many namespaces");
+}
+
+// --- small stacks ------------------------------------------------------------------------------
+
+std::string nestedModel(size_t depth) {
+  return "<!DOCTYPE a [<!ELEMENT a " + std::string(depth, '(') + "b" + std::string(depth, ')') +
+         ">]><a/>";
+}
+
+std::string nestedEntities(size_t depth, std::string_view use) {
+  std::string text = "<!DOCTYPE a [<!ENTITY e0 'x'>";
+  for (size_t level = 1; level <= depth; ++level) {
+    text += "<!ENTITY e" + std::to_string(level) + " '&e" + std::to_string(level - 1) + ";'>";
+  }
+  return text + "]>" + std::string(use);
+}
+
+TEST(XMLParser, ASmallStackIsEnough) {
+  for (const size_t size : {size_t{48} << 10, size_t{64} << 10, size_t{160} << 10}) {
+    onStack(size, [] {
+      EXPECT_TRUE(parsed("<a>text</a>"));
+      EXPECT_TRUE(parsed(nestedModel(249)));
+      EXPECT_TRUE(parsed(nestedModel(2000)));
+      EXPECT_TRUE(parsed(nestedEntities(500, "<a>&e500;</a>")));
+      EXPECT_TRUE(parsed(nestedEntities(900, "<a b='&e900;'/>")));
+      EXPECT_NE(errorOf(nestedModel(100000)).message.find("too deep"), std::string::npos);
+      errorOf(nestedEntities(100000, "<a>&e100000;</a>"));
+      const TestFolder folder;
+      folder.write("a.xml", "<a/>");
+      NSXMLParseError error;
+      EXPECT_TRUE(NSXMLDocument::documentWithFile(folder.path("a.xml"), 0, &error))
+          << error.message;
+      EXPECT_TRUE(NSXMLDocument::documentWithData("<p>one<p>two", NSXMLDocumentTidyHTML, &error))
+          << error.message;
+    });
+  }
 }
 
 TEST(XMLParser, DeclarationsOfNestedTagsAreNotBounded) {

@@ -1,0 +1,161 @@
+#include "Platform/Reading/MarkupMeter.h"
+
+#include <algorithm>
+
+namespace xquery {
+
+void MarkupMeter::restart(Place place) {
+  struct Beginning {
+    State state;
+    std::string_view ending;
+  };
+  // In the order of the places.
+  static constexpr Beginning beginnings[] = {
+      {State::Content, {}},  {State::Declaration, {}}, {State::Passed, "-->"},
+      {State::Passed, "?>"}, {State::Passed, "]]>"},   {State::Beyond, {}},
+  };
+  const Beginning& beginning = beginnings[static_cast<size_t>(place)];
+  _state = _around = beginning.state;
+  _ending = beginning.ending;
+  _matched = _depth = 0;
+  _attributes = _listed = 0;
+  _mostAttributes = _mostListed = 0;
+}
+
+void MarkupMeter::read(std::string_view text) {
+  for (size_t at = 0; at < text.size();) {
+    switch (_state) {
+      case State::Content:
+        at = readContent(text, at);
+        break;
+      case State::Less:
+      case State::Exclamation:
+        at = readOpening(text, at);
+        break;
+      case State::Tag:
+        at = readTag(text, at);
+        break;
+      case State::Declaration:
+        at = readDeclaration(text, at);
+        break;
+      case State::Literal:
+        at = readLiteral(text, at);
+        break;
+      case State::Passed:
+        at = readPassed(text, at);
+        break;
+      case State::Beyond:
+        return;
+    }
+  }
+}
+
+size_t MarkupMeter::readContent(std::string_view text, size_t at) {
+  const size_t less = text.find('<', at);
+  if (less == text.npos) return text.size();
+  _state = State::Less;
+  return less + 1;
+}
+
+size_t MarkupMeter::readOpening(std::string_view text, size_t at) {
+  const char byte = text[at];
+  if (_state == State::Less && byte == '!') {
+    _state = State::Exclamation;
+    return at + 1;
+  }
+  if (_state == State::Less && byte != '?') {
+    _state = State::Tag;
+    _attributes = 0;
+    return at;
+  }
+  if (byte == '?') {
+    pass("?>");
+  } else if (byte == '-') {
+    pass("-->");
+  } else if (byte == '[') {
+    pass("]]>");
+  } else {
+    _state = State::Declaration;
+    _depth = _listed = 0;
+  }
+  return at + 1;
+}
+
+size_t MarkupMeter::readTag(std::string_view text, size_t at) {
+  const size_t found = text.find_first_of("=\"'>", at);
+  if (found == text.npos) return text.size();
+  switch (text[found]) {
+    case '=':
+      _mostAttributes = std::max(_mostAttributes, ++_attributes);
+      break;
+    case '>':
+      _state = State::Content;
+      break;
+    default:
+      openLiteral(text.substr(found, 1));
+  }
+  return found + 1;
+}
+
+// A list may stand in the text of a parameter entity, without its parentheses.
+size_t MarkupMeter::readDeclaration(std::string_view text, size_t at) {
+  const size_t found = text.find_first_of("|,()\"'<>", at);
+  if (found == text.npos) return text.size();
+  switch (text[found]) {
+    case '|':
+    case ',':
+      _mostListed = std::max(_mostListed, ++_listed);
+      break;
+    case '(':
+      if (_depth++ == 0) _listed = 0;
+      break;
+    case ')':
+      _depth -= std::min(_depth, size_t{1});
+      break;
+    case '<':
+      _state = State::Less;
+      break;
+    case '>':
+      _state = State::Content;
+      break;
+    default:
+      openLiteral(text.substr(found, 1));
+  }
+  return found + 1;
+}
+
+void MarkupMeter::openLiteral(std::string_view quote) {
+  _around = _state;
+  _state = State::Literal;
+  _ending = quote == "'" ? "'" : "\"";
+}
+
+size_t MarkupMeter::readLiteral(std::string_view text, size_t at) {
+  const size_t end = text.find(_ending[0], at);
+  if (end == text.npos) return text.size();
+  _state = _around;
+  return end + 1;
+}
+
+void MarkupMeter::pass(std::string_view ending) {
+  _state = State::Passed;
+  _ending = ending;
+  _matched = 0;
+}
+
+// The ending may come in pieces; its bytes before the last repeat the first.
+size_t MarkupMeter::readPassed(std::string_view text, size_t at) {
+  if (_matched == 0) {
+    at = text.find(_ending[0], at);
+    if (at == text.npos) return text.size();
+  }
+  const char byte = text[at];
+  if (byte == _ending[_matched]) {
+    if (++_matched == _ending.size()) _state = State::Content;
+  } else if (byte != _ending[0]) {
+    _matched = 0;
+  }
+  return at + 1;
+}
+
+}  // namespace xquery
