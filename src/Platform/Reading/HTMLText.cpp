@@ -1,5 +1,6 @@
 #include "Platform/Reading/HTMLText.h"
 
+#include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/ASCII.h"
 #include "Platform/Text/Encoding.h"
 #include "xquery/String.h"
@@ -75,6 +76,7 @@ class TagReader {
     for (_at = _HTML.find('<', _at); _at < _HTML.size(); _at = _HTML.find('<', _at)) {
       ++_at;
       if (_at < _HTML.size() && isLetter(_HTML[_at])) {
+        charge();
         _name = _at;
         return true;
       }
@@ -117,6 +119,15 @@ class TagReader {
     return _at < last ? _HTML.find(quote, _at + 1) : _at;
   }
 
+  // What has been passed since the last time.
+  void charge() {
+    constexpr size_t bytesPerStep = 4096;
+    const size_t steps = (_at - _chargedTo) / bytesPerStep;
+    if (steps == 0) return;
+    checkWork(steps);
+    _chargedTo = _at;
+  }
+
   void skipToEndTag(std::string_view name) {
     for (size_t at = _HTML.find("</", _at); at != _HTML.npos; at = _HTML.find("</", at + 1)) {
       if (lowerCase(_HTML.substr(at + 2, name.size())) == name) {
@@ -130,6 +141,7 @@ class TagReader {
   const std::string_view _HTML;
   size_t _at = 0;
   size_t _name = 0;
+  size_t _chargedTo = 0;
   size_t _lastDouble = std::string_view::npos;
   size_t _lastSingle = std::string_view::npos;
 };

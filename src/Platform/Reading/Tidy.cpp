@@ -6,12 +6,14 @@
 //
 // Some of its loops ask for no memory, and a few of those take time that grows with the square of
 // what they work on. Whoever waits for the thread therefore leaves it behind when it comes to no
-// end, and what it works on is owned by both.
+// end, and what it works on is owned by both. What it takes meanwhile counts as memory of whoever
+// waits.
 //
 // What it makes of the HTML is not written by libtidy but here: as XML that is always well formed,
 // and without the line breaks that a pretty printer adds.
 #include "Platform/Reading/Tidy.h"
 
+#include "Platform/Base/CountedBytes.h"
 #include "Platform/Base/ThreadClock.h"
 #include "Platform/Base/WorkerThread.h"
 #include "Platform/Base/WorkMeter.h"
@@ -53,22 +55,41 @@ constexpr int mostLeftBehind = 4;
 // that has so many is seldom meant well, so that a thread is not spent on it.
 constexpr size_t mostAttributes = 5'000;
 constexpr const char* tooMuchTime = "HTML takes too much time";
+constexpr const char* tooMuchMemory = "HTML takes too much memory";
+
+// What the values of this thread may still take.
+size_t roomForValues() {
+  const WorkMeter& meter = workMeter;
+  if (meter.mostValueBytes == INT64_MAX) return SIZE_MAX;
+  return static_cast<size_t>(std::max<int64_t>(meter.mostValueBytes - meter.valueBytes, 0));
+}
 
 // --- the allocator -------------------------------------------------------------------------------
 
 class Allocator {
  public:
   explicit Allocator(size_t inputBytes)
-      : _mostBytes(mostMemory + inputBytes * mostMemoryPerByte),
+      : _mostBytes(std::min(mostMemory + inputBytes * mostMemoryPerByte, roomForValues())),
         _mostSeconds(mostSeconds + static_cast<double>(inputBytes) * mostSecondsPerByte) {}
-  ~Allocator() {
-    while (_blocks) unlink(_blocks);
-  }
+  ~Allocator() { freeAll(); }
   Allocator(const Allocator&) = delete;
   Allocator& operator=(const Allocator&) = delete;
 
   TidyAllocator* forTidy() { return &_shell.tidy; }
   const char* failure() const { return _failure; }
+  void freeAll() {
+    while (_blocks) unlink(_blocks);
+  }
+  // From any thread: what has been taken, what is written included, and what would have been when
+  // a request was refused.
+  size_t bytes() const { return _bytes.load(std::memory_order_relaxed); }
+  size_t refusedBytes() const { return _refusedBytes; }
+  // What is written grows by doubling; a limit may be reached here.
+  void noteWritten(size_t capacity) {
+    _bytes.fetch_add(capacity - _written, std::memory_order_relaxed);
+    _written = capacity;
+    check(0);
+  }
   double allowedSeconds() const { return _mostSeconds; }
   // From another thread: the next request for memory is a limit reached.
   void abandon() { _isAbandoned.store(true, std::memory_order_relaxed); }
@@ -109,7 +130,10 @@ class Allocator {
   void check(size_t more) {
     if (_isAbandoned.load(std::memory_order_relaxed)) leave(tooMuchTime);
     if (_stackStart - here() > usableStack) leave("HTML nested too deeply");
-    if (more > _mostBytes - std::min(_bytes, _mostBytes)) leave("HTML takes too much memory");
+    if (more > _mostBytes - std::min(bytes(), _mostBytes)) {
+      _refusedBytes = bytes() + more;
+      leave(tooMuchMemory);
+    }
     constexpr unsigned betweenClocks = 256;
     if (++_calls % betweenClocks == 0 && threadSeconds() > _mostSeconds) {
       leave(tooMuchTime);
@@ -120,7 +144,7 @@ class Allocator {
     block->next = _blocks;
     if (_blocks) _blocks->previous = block;
     _blocks = block;
-    _bytes += block->size;
+    _bytes.fetch_add(block->size, std::memory_order_relaxed);
   }
   void unlink(Block* block) {
     detach(block);
@@ -129,7 +153,7 @@ class Allocator {
   void detach(Block* block) {
     if (block->next) block->next->previous = block->previous;
     (block->previous ? block->previous->next : _blocks) = block->next;
-    _bytes -= block->size;
+    _bytes.fetch_sub(block->size, std::memory_order_relaxed);
   }
 
   static void* allocate(TidyAllocator* self, size_t size);
@@ -142,7 +166,9 @@ class Allocator {
 
   Shell _shell = {{&functions}, this};
   Block* _blocks = nullptr;
-  size_t _bytes = 0;
+  std::atomic<size_t> _bytes = 0;
+  size_t _written = 0;
+  size_t _refusedBytes = 0;
   const size_t _mostBytes;
   const double _mostSeconds;
   unsigned _calls = 0;
@@ -222,9 +248,9 @@ bool isXMLCharacter(char32_t point) {
 // that needs a destructor.
 class Writer {
  public:
-  Writer(TidyDoc document, TidyAllocator* allocator, std::string& out)
-      : _document(document), _out(out) {
-    tidyBufInitWithAllocator(&_value, allocator);
+  Writer(TidyDoc document, Allocator& allocator, std::string& out)
+      : _document(document), _allocator(allocator), _out(out) {
+    tidyBufInitWithAllocator(&_value, allocator.forTidy());
   }
   void write();
 
@@ -241,6 +267,7 @@ class Writer {
   std::string_view value(TidyNode node);
 
   TidyDoc _document;
+  Allocator& _allocator;
   std::string& _out;
   TidyBuffer _value;
   std::unordered_set<std::string_view> _attributes;  // of the tag being written
@@ -282,6 +309,7 @@ void Writer::write() {
 }
 
 bool Writer::open(TidyNode node) {
+  _allocator.noteWritten(_out.capacity());
   switch (tidyNodeGetType(node)) {
     case TidyNode_Start:
     case TidyNode_StartEnd:
@@ -418,6 +446,7 @@ class Conversion : public std::enable_shared_from_this<Conversion> {
   // Likewise; otherwise it is left behind.
   bool waitFor(pthread_t thread);
   bool leave(pthread_t thread);
+  void refuse();
 
   const std::string _HTML;
   Allocator _allocator;
@@ -468,7 +497,7 @@ void Conversion::run() {
   tidyBufInitWithAllocator(&input, _allocator.forTidy());
   auto* const bytes = reinterpret_cast<byte*>(const_cast<char*>(_HTML.data()));
   tidyBufAttach(&input, bytes, static_cast<uint>(_HTML.size()));
-  Writer writer(_document, _allocator.forTidy(), _XHTML);
+  Writer writer(_document, _allocator, _XHTML);
   _isDone = _allocator.run([&] {
     configure();
     if (tidyParseBuffer(_document, &input) < 0 || tidyCleanAndRepair(_document) < 0) return;
@@ -483,6 +512,8 @@ void* Conversion::start(void* self) {
   } catch (...) {
     conversion->_exception = std::current_exception();
   }
+  // Not by whoever waits, who may have to end soon.
+  conversion->_allocator.freeAll();
   const std::lock_guard lock(conversion->_mutex);
   conversion->_hasEnded = true;
   if (conversion->_isLeftBehind) --leftBehind;
@@ -503,8 +534,10 @@ bool Conversion::endsSoon(pthread_t thread) {
 bool Conversion::waitFor(pthread_t thread) {
   clockid_t processor = CLOCK_THREAD_CPUTIME_ID;
   ::pthread_getcpuclockid(thread, &processor);
+  CountedBytes counted;
   try {
     while (!endsSoon(thread)) {
+      counted.set(_allocator.bytes());
       lookAtWork();
       if (threadSeconds(processor) > _allocator.allowedSeconds() + patience) return leave(thread);
     }
@@ -513,6 +546,12 @@ bool Conversion::waitFor(pthread_t thread) {
     leave(thread);
     throw;
   }
+}
+
+// Throws when it was the ceiling of this thread's values that was reached, and not our own.
+void Conversion::refuse() {
+  countValueBlock(_allocator.refusedBytes());
+  uncountValueBytes(_allocator.refusedBytes());
 }
 
 bool Conversion::leave(pthread_t thread) {
@@ -536,6 +575,7 @@ std::optional<std::string> Conversion::XHTML(std::string& failure) {
   }
   failure = tooMuchTime;
   if (!waitFor(thread)) return std::nullopt;
+  if (_allocator.failure() == tooMuchMemory) refuse();
   if (_exception) std::rethrow_exception(_exception);
   if (_isDone && !_XHTML.empty()) return std::move(_XHTML);
   failure = *_allocator.failure() ? _allocator.failure() : "HTML cannot be read";

@@ -4,6 +4,7 @@
 // 8-bit if it can be, and becomes a text node unless it is white space that is not to be kept.
 // Names are looked up by the addresses of libxml2's texts, which are equal for equal names within
 // one document, so that the process's table of names is asked once per name and document.
+#include "Platform/Base/CountedBytes.h"
 #include "Platform/Base/Stack.h"
 #include "Platform/Reading/LibXML.h"
 #include "Platform/Reading/Tidy.h"
@@ -322,6 +323,7 @@ Ref<NSXMLDocument> parseHTML(std::string_view bytes, uint32_t options, NSXMLPars
     error = {failure, 0, 0};
     return nullptr;
   }
+  const CountedBytes counted(XHTML->capacity());
   return NSXMLDocument::documentWithData(*XHTML, options & ~uint32_t{NSXMLDocumentTidyHTML},
                                          &error);
 }

@@ -305,6 +305,42 @@ TEST(TidyHostile, AReadingThatIsNotWaitedForEnds) {
   EXPECT_THROW((void)XHTMLFromHTML(HTML, failure), Interruption);
 }
 
+TEST(TidyHostile, WhatLibtidyTakesCountsAsValues) {
+  waitForTheLastThread();
+  const std::string HTML = repeated("<i></i>", 200'000);
+  const int64_t before = workMeter.valueBytes;
+  workMeter.mostValueBytes = before + (int64_t{16} << 20);
+  std::string failure;
+  EXPECT_THROW((void)XHTMLFromHTML(HTML, failure), std::bad_alloc);
+  EXPECT_TRUE(workMeter.wasRefused);
+  EXPECT_EQ(workMeter.valueBytes, before) << "nothing is kept";
+  workMeter = WorkMeter{};
+  EXPECT_EQ(outcome(HTML), "document");
+}
+
+// A look counts as soon as more than ten milliseconds have passed.
+class MostBytes final : public WorkWatcher {
+ public:
+  MostBytes() { workMeter.watcher = this; }
+  ~MostBytes() { workMeter = WorkMeter{}; }
+  void lookAtWork() override {
+    workMeter.stepsLeft = 1;
+    _most = std::max(_most, workMeter.valueBytes);
+  }
+  int64_t most() const { return _most; }
+
+ private:
+  int64_t _most = 0;
+};
+
+TEST(TidyHostile, WhatLibtidyTakesIsSeenWhileItTakesIt) {
+  const std::string HTML = repeated("<i></i>", 300'000);
+  const MostBytes watcher;
+  std::string failure;
+  EXPECT_TRUE(XHTMLFromHTML(HTML, failure)) << failure;
+  EXPECT_GT(watcher.most(), 16 << 20);
+}
+
 TEST(Tidy, RunsInSeveralThreadsAtOnce) {
   std::vector<std::thread> threads;
   for (int n = 0; n < 4; ++n) {
