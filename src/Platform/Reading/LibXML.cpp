@@ -98,7 +98,8 @@ class Parse {
   xmlParserCtxt* _parser = nullptr;
   size_t _bytesRead = 0;
   size_t _bytesAdded = 0;
-  MarkupMeter _meter;                  // of what came since the last event
+  MarkupMeter _meter;  // of what came since the last event, if measuring
+  bool _isMeasuring = false;
   size_t _measuredTo = 0;              // the place in the document's text
   const xmlChar* _declared = nullptr;  // the entity, until it is asked for
   size_t _listedInEntities = 0;        // since the last declaration
@@ -209,9 +210,10 @@ void Parse::hear(const xmlError& error) {
                          error.domain == XML_FROM_TREE));
   if (_failed || isMinor) return;
   // What concerns the input is heard while it is read, when the parser cannot be stopped.
-  const bool isOfInput = error.domain != XML_FROM_PARSER && error.domain != XML_FROM_NAMESPACE;
+  const bool isOfInput =
+      !_parser || (error.domain != XML_FROM_PARSER && error.domain != XML_FROM_NAMESPACE);
   if (!isOfInput) return failAt(error.message, error.line, error.int2);
-  const xmlParserInput* input = _parser->input;
+  const xmlParserInput* input = _parser ? _parser->input : nullptr;
   note(error.message, input ? input->line : 0, input ? input->col : 0);
 }
 
@@ -252,7 +254,7 @@ size_t Parse::position() const {
 // What came up to here is done with.
 void Parse::hasEvent() {
   _measuredTo = position();
-  _meter.restart(isInsideDTD() ? MarkupMeter::Place::Declaration : MarkupMeter::Place::Content);
+  _isMeasuring = false;
 }
 
 // Where the parser is, if not in markup that began before.
@@ -284,7 +286,10 @@ void Parse::measureInput() {
   if (_measuredTo < input->consumed) {
     _measuredTo = position();
     _meter.restart(placeOf(*_parser));
+  } else if (!_isMeasuring) {
+    _meter.restart(isInsideDTD() ? MarkupMeter::Place::Declaration : MarkupMeter::Place::Content);
   }
+  _isMeasuring = true;
   const size_t start = std::min(_measuredTo - input->consumed, held);
   _meter.read({text + start, held - start});
   _measuredTo = input->consumed + held;
@@ -535,12 +540,12 @@ struct FreeParser {
 };
 
 bool Parse::run() {
+  const Hearing hearing(*this);
   xmlSAXHandler handler = callbacks();
   const std::unique_ptr<xmlParserCtxt, FreeParser> parser(
       xmlCreateIOParserCtxt(&handler, this, readInput, nullptr, this, XML_CHAR_ENCODING_NONE));
   if (!parser) throw std::bad_alloc();
   _parser = parser.get();
-  const Hearing hearing(*this);
   xmlCtxtUseOptions(_parser, XML_PARSE_HUGE | XML_PARSE_NOENT | XML_PARSE_NONET);
   const bool isWellFormed = xmlParseDocument(_parser) == 0 && _parser->wellFormed;
   if (!_failed && !isWellFormed) fail(nullptr);

@@ -130,7 +130,7 @@ class Allocator {
   void check(size_t more) {
     if (_isAbandoned.load(std::memory_order_relaxed)) leave(tooMuchTime);
     if (_stackStart - here() > usableStack) leave("HTML nested too deeply");
-    if (more > _mostBytes - std::min(bytes(), _mostBytes)) {
+    if (bytes() + more > _mostBytes) {
       _refusedBytes = bytes() + more;
       leave(tooMuchMemory);
     }

@@ -9,6 +9,13 @@
 
 namespace xquery {
 
+// How much more stack a function takes under sanitizers.
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr size_t sanitizedStackFactor = 4;
+#else
+constexpr size_t sanitizedStackFactor = 1;
+#endif
+
 // On a thread with a stack of that many bytes.
 inline void onStack(size_t bytes, std::function<void()> work) {
   pthread_attr_t attributes;

@@ -432,7 +432,7 @@ std::string nestedEntities(size_t depth, std::string_view use) {
 
 TEST(XMLParser, ASmallStackIsEnough) {
   for (const size_t size : {size_t{48} << 10, size_t{64} << 10, size_t{160} << 10}) {
-    onStack(size, [] {
+    onStack(size * sanitizedStackFactor, [] {
       EXPECT_TRUE(parsed("<a>text</a>"));
       EXPECT_TRUE(parsed(nestedModel(249)));
       EXPECT_TRUE(parsed(nestedModel(2000)));

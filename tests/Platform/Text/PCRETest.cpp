@@ -50,7 +50,7 @@ TEST(PCRE, ASmallStackIsEnoughForNestedGroups) {
   const std::string found = search(nested, "abc");
   const std::string foundInLong = search(nested, longSubject);
   EXPECT_NE(found, "bad pattern");
-  onStack(size_t{96} << 10, [&] {
+  onStack((size_t{96} << 10) * sanitizedStackFactor, [&] {
     EXPECT_EQ(search(nested, "abc"), found);
     EXPECT_EQ(search(nested, longSubject), foundInLong) << "translated";
     EXPECT_EQ(search(std::string(300, '(') + std::string(300, ')'), "a"), "bad pattern");
