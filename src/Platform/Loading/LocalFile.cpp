@@ -9,6 +9,7 @@
 #include <cstring>
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <vector>
 
 namespace xquery {
 
@@ -31,10 +32,10 @@ Descriptor openFound(const Descriptor& found) {
 std::optional<std::string> readAll(const Descriptor& file, uint64_t size, uint64_t mostBytes,
                                    std::string& failure) {
   GatheredBytes data(size);
-  char piece[65536];
+  std::vector<char> piece(65536);  // not on a host's stack, which may be small
   for (;;) {
     checkWork();
-    const ssize_t count = ::read(file.number(), piece, sizeof piece);
+    const ssize_t count = ::read(file.number(), piece.data(), piece.size());
     if (count < 0 && errno == EINTR) continue;
     if (count < 0) failure = std::strerror(errno);
     if (count < 0) return std::nullopt;
@@ -44,7 +45,7 @@ std::optional<std::string> readAll(const Descriptor& file, uint64_t size, uint64
       failure = tooLong;
       return std::nullopt;
     }
-    data.append({piece, static_cast<size_t>(count)});
+    data.append({piece.data(), static_cast<size_t>(count)});
   }
 }
 
