@@ -466,7 +466,8 @@ uint64_t NSXMLTree::finishedChangeCount() {
 }
 
 void NSXMLTree::noteTextChange(const NSXMLNode* node) {
-  if (!isUnfinished(node)) ++changes.ofFinished;
+  // One that has got a parent meanwhile, by way of a child, is inside a finished one.
+  if (!isUnfinished(node) || node->_parent) ++changes.ofFinished;
 }
 
 void NSXMLTree::noteChange(const NSXMLNode* parent) {

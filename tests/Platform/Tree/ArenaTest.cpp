@@ -135,6 +135,20 @@ TEST(XMLTree, AMergedTreeIsAsOldAsItsOldestPart) {
   EXPECT_FALSE(NSXMLTree::isNew(parent.get()));
 }
 
+TEST(XMLTree, WhatIsAddedToAnUnfinishedNodeCountsOnceThatIsInsideAnother) {
+  const auto outer = NSXMLElement::elementWithName(A("o"));
+  const auto inner = NSXMLElement::elementWithName(A("i"));
+  const NSXMLUnfinished unfinished(*inner);
+  const uint64_t before = NSXMLTree::finishedChangeCount();
+  EXPECT_TRUE(inner->addChild(NSXMLElement::elementWithName(A("a"))));
+  EXPECT_EQ(NSXMLTree::finishedChangeCount(), before);
+  EXPECT_TRUE(outer->addChild(inner));
+  const uint64_t inside = NSXMLTree::finishedChangeCount();
+  EXPECT_GT(inside, before);
+  EXPECT_TRUE(inner->addChild(NSXMLElement::elementWithName(A("b"))));
+  EXPECT_GT(NSXMLTree::finishedChangeCount(), inside);
+}
+
 TEST(XMLTree, ANodeIsNeverAddedBelowItself) {
   const auto a = NSXMLElement::elementWithName(A("a"));
   const auto b = NSXMLElement::elementWithName(A("b"));
