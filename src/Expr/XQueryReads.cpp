@@ -25,7 +25,7 @@ class Reader {
   // The steps up to `end`, of which only the test counts; to the last one when it is null.
   void addSteps(const XQueryStep* first, const XQueryStep* end, bool hasOuterFocus) {
     for (const XQueryStep* step = first; step; step = step->next()) {
-      addStep(*step, step == first, hasOuterFocus && step == first, step != end);
+      addStep(*step, hasOuterFocus && step == first, step != end);
       if (step == end || _waiting.size() > mostExpressions) return;
     }
   }
@@ -45,13 +45,10 @@ class Reader {
     bool hasOuterFocus;
   };
 
-  void addStep(const XQueryStep& step, bool isFirst, bool hasOuterFocus, bool withPredicates) {
+  void addStep(const XQueryStep& step, bool hasOuterFocus, bool withPredicates) {
     if (const auto* axisStep = dyn_cast<XQueryAxisStep>(&step)) {
       if (hasOuterFocus) _reads.focus = true;
       if (!staysInside(axisStep->axis())) _reads.outside = true;
-      if (axisStep->testMayRaise()) _reads.failsInPath = true;
-    } else if (!isFirst || !step.predicates().empty()) {
-      _reads.failsInPath = true;
     }
     add(step.expr(), hasOuterFocus);
     if (!withPredicates) return;

@@ -25,9 +25,6 @@ struct XQueryReads {
   // of the document from a last child of a last child.
   bool outside = false;
   bool globals = false;
-  // An error may come up behind the first step of a path, which leaves another size in the focus
-  // than there was before.
-  bool failsInPath = false;
   // A document may be fetched, once for the whole evaluation.
   bool loads = false;
   // IDs of local variables, each once.

@@ -127,8 +127,7 @@ XQueryJoinCondition XQueryJoinCondition::in(const XQueryExpr* condition, bool er
       best.guards = guards;
     }
     if (errorExcludes) {
-      const bool shows = parts.loads || (parts.failsInPath && !XQueryIsRepeatable(*condition));
-      if (shows) break;
+      if (parts.loads) break;
       continue;
     }
     const XQueryJoinReads read = reads(*conjunct);

@@ -362,8 +362,8 @@ TEST(Join, WhatIsAroundTheNodesOfADocumentStays) {
   }
 }
 
-// An error leaves the size of the list in which it came up, and the predicate is not asked for all.
-TEST(Join, SizesThatErrorsLeaveAreSeen) {
+// So nobody can tell of which items the predicate was asked.
+TEST(Join, AnErrorInAPathLeavesTheSizeAsItWas) {
   for (const char* condition : {"c/xs:date(.) = '3'", "c[1]/xs:date(.) = '3'", "not(c/xs:date(.))",
                                 "count((c[1], 1)[. = 1]/c) = 0", "@n"}) {
     expectPredicateAsPlain("$all", std::string(condition) + " and @k = $p and last() = 9", "/@n");
