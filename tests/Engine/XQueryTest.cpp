@@ -375,6 +375,25 @@ TEST_F(Driver, WithLoggingOnErrorsStillReachTheCaller) {
   EXPECT_EQ(error->err(), 8);
 }
 
+TEST_F(Driver, WithLoggingOnAnErrorIsAnAssertionFailureInTheLogAndTheSameForTheCaller) {
+  const std::string description = "XQueryError:6 - \"Division by zero\" at line:2";
+  EXPECT_FALSE(evaluate("1 +\n1 div 0"));
+  EXPECT_EQ(error->description()->utf8(), description);
+  setenv("XQUERY_LOG", "1", 1);
+  testing::internal::CaptureStderr();
+  EXPECT_FALSE(evaluate("1 +\n1 div 0"));
+  const std::string log = testing::internal::GetCapturedStderr();
+  unsetenv("XQUERY_LOG");
+  EXPECT_EQ(error->description()->utf8(), description);
+  const std::string failure =
+      "*** Assertion failure in -[XQueryContextInternal setError:raiseException:], "
+      "Eval/XQueryContextInternal:288: " +
+      description + "\n";
+  const size_t at = log.find(failure);
+  ASSERT_NE(at, log.npos) << log;
+  EXPECT_EQ(log.find("***", at + 1), log.npos) << "one cause, one line";
+}
+
 TEST_F(Driver, FirstElementIsDecoratedWithItsRecordedBaseURI) {
   Ref<NSXMLElement> element;
   evaluateBody([&](XQueryContextInternal& internal) -> Value {
