@@ -24,30 +24,26 @@ void XQueryConditionalExpr::bindInfoForProlog(XQueryProlog& prolog) {
 Value XQueryConditionalExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   const XQueryExpr* branch = nullptr;
-  if (!chooseBranch(branch, context)) return {};
-  Value value = XQueryEvaluateOrEmpty(branch, context);
-  if (!value && !context._internal().isFailing()) failConversion(context);
-  return value;
-}
-
-// False for a test that has failed. What it needs of the stack is no part of a recursion's frames.
-bool XQueryConditionalExpr::chooseBranch(const XQueryExpr*& branch, XQueryContext& context) const {
-  const Value test = XQueryEvaluateOrEmpty(_test.get(), context);
-  if (XQueryHasFailed(test, context)) return false;
-  const Value truth = XQueryEffectiveBooleanValue(test, context);
-  if (truth == NSNumber::trueValue()) {
-    branch = _then.get();
-  } else if (truth == NSNumber::falseValue()) {
-    branch = _else.get();
-  } else {
-    failConversion(context);
-    return false;
+  {
+    const Value test = XQueryEvaluateOrEmpty(_test.get(), context);
+    if (XQueryHasFailed(test, context)) return {};
+    const Value truth = XQueryEffectiveBooleanValue(test, context);
+    if (truth == NSNumber::trueValue()) {
+      branch = _then.get();
+    } else if (truth == NSNumber::falseValue()) {
+      branch = _else.get();
+    } else {
+      return failConversion(context);
+    }
   }
-  return true;
+  Value value = XQueryEvaluateOrEmpty(branch, context);
+  if (value || context._internal().isFailing()) return value;
+  return failConversion(context);
 }
 
-void XQueryConditionalExpr::failConversion(XQueryContext& context) const {
-  context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
+// Out of line: what it needs of the stack is no part of a recursion's frames.
+Value XQueryConditionalExpr::failConversion(XQueryContext& context) const {
+  return context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
 }
 
 }  // namespace xquery

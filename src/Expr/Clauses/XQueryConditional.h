@@ -29,8 +29,7 @@ class XQueryConditionalExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  [[gnu::noinline]] bool chooseBranch(const XQueryExpr*& branch, XQueryContext& context) const;
-  [[gnu::noinline, gnu::cold]] void failConversion(XQueryContext& context) const;
+  [[gnu::noinline, gnu::cold]] Value failConversion(XQueryContext& context) const;
 
   Ref<XQueryExpr> _test;
   Ref<XQueryExpr> _then;
