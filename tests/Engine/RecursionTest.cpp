@@ -31,7 +31,7 @@ constexpr Way ways[] = {
     {"Plain", "1 + %"},
     {"Tail", "%"},
     {"Sequence", "(1, %)[1]"},
-    {"List", "(1, %)"},
+    {"List", "subsequence((1, %), 1, 2)"},
     {"Argument", "count((1, %))"},
     {"ManyArguments", "concat('', '', '', '', %)"},
     {"OwnArgument", "local:same(%)"},
