@@ -29,26 +29,45 @@ constexpr size_t mostUse = size_t{192} << 20;
 constexpr size_t mostUse = size_t{1} << 30;
 #endif
 
+struct Stack {
+  uintptr_t base;  // its lowest address
+  size_t size;
+};
+
 // Where the main thread's stack is the system library reads from a file of the kernel, which may
 // not be there or not be opened for want of a descriptor. Half of what the limit allows is then
 // taken to be left below this frame.
-uintptr_t guessedLowestAddress() {
+Stack guessedStack() {
   constexpr rlim_t usualSize = rlim_t{8} << 20;
   rlimit limit = {};
   const bool isKnown = getrlimit(RLIMIT_STACK, &limit) == 0 && limit.rlim_cur != RLIM_INFINITY;
   const uintptr_t address = XQueryStackAddress();
   const uintptr_t room = (isKnown ? limit.rlim_cur : usualSize) / 2;
-  return room < address ? address - room : address;
+  const uintptr_t left = std::min(address, room);
+  return {address - left, left};
 }
 
-uintptr_t lowestUsableAddress() {
+Stack stackOfThread() {
   pthread_attr_t attributes;
-  if (pthread_getattr_np(pthread_self(), &attributes) != 0) return guessedLowestAddress();
+  if (pthread_getattr_np(pthread_self(), &attributes) != 0) return guessedStack();
   void* base = nullptr;
   size_t size = 0;
   pthread_attr_getstack(&attributes, &base, &size);
   pthread_attr_destroy(&attributes);
-  return XQueryLowestStackAddress(reinterpret_cast<uintptr_t>(base), size);
+  return {reinterpret_cast<uintptr_t>(base), size};
+}
+
+uintptr_t lowestUsableAddress() {
+  const Stack stack = stackOfThread();
+  return XQueryLowestStackAddress(stack.base, stack.size);
+}
+
+// Below the usable part as well.
+bool stackHas(size_t bytes) {
+  const uintptr_t address = XQueryStackAddress();
+  if (XQueryStackHasRoom() && address - workMeter.stackLimit >= bytes) return true;
+  const Stack stack = stackOfThread();
+  return address > stack.base && address - stack.base >= bytes;
 }
 
 }  // namespace
@@ -63,6 +82,11 @@ bool XQueryStackHasRoom() {
   WorkMeter& meter = workMeter;
   if (meter.stackLimit == UINTPTR_MAX) meter.stackLimit = lowestUsableAddress();
   return XQueryStackAddress() > meter.stackLimit;
+}
+
+void XQueryCheckStackFor(XQueryContextInternal& context, size_t bytes) {
+  static_assert(XQueryMostLibraryStack <= reserve, "a stack that is not small has enough");
+  if (!stackHas(bytes)) context.raise(XQueryErrors::nestedTooDeeply.error());
 }
 
 void XQueryCheckStackClosely(XQueryContext& context) {

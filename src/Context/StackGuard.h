@@ -11,6 +11,7 @@
 namespace xquery {
 
 class XQueryContext;
+class XQueryContextInternal;
 class XQueryProlog;
 
 // Whether enough stack is left to go one level deeper.
@@ -49,6 +50,10 @@ void XQueryCheckStackClosely(XQueryContext& context);
     XQueryCheckStackClosely(context);
   }
 }
+// Before work of a library that takes so many bytes of the stack, of which a small one may not have
+// enough left even where evaluation may go on: raises the same error then.
+inline constexpr size_t XQueryMostLibraryStack = 256 * 1024;
+void XQueryCheckStackFor(XQueryContextInternal& context, size_t bytes);
 // The same while binding. Nesting too deep adds the error to the prolog (once) and answers false; a
 // limit that is reached ends the evaluation that the binding is part of, if any.
 bool XQueryCheckStack(XQueryProlog& prolog);

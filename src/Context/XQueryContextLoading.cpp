@@ -1,4 +1,5 @@
 // The documents and raw bodies of one context.
+#include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Loading/GatheredBytes.h"
@@ -14,6 +15,10 @@ namespace {
 constexpr uint32_t XMLOptions = NSXMLNodePreserveEmptyElements | NSXMLNodePreserveCDATA;
 constexpr uint32_t HTMLOptions = XMLOptions | NSXMLDocumentTidyHTML;
 static_assert(XMLOptions == 0x1000006 && HTMLOptions == 0x1000206);
+
+// What fetching and parsing take.
+constexpr size_t stackForLoading = size_t{80} * 1024;
+static_assert(stackForLoading <= XQueryMostLibraryStack);
 
 bool isHTML(const XQueryResource& resource, const NSURL& URL) {
   if (resource.MIMEType && lowerCase(*resource.MIMEType) == "text/html") return true;
@@ -31,6 +36,7 @@ Value XQueryContextInternal::XQueryDocumentForURL(const Ref<NSURL>& URL) {
   if (const auto found = _documentCache.find(URL); found != _documentCache.end()) {
     return found->second;
   }
+  XQueryCheckStackFor(*this, stackForLoading);
   // The host may set other settings while its loader is called.
   const Ref<NSURLLoader> loader = _loader;
   const auto resource = loader->load(*URL, XQueryLoadPurpose::Document);
@@ -53,6 +59,7 @@ Ref<NSData> XQueryContextInternal::URLBody(const Ref<NSURL>& URL) {
   // The documents are looked through here, not the handles: a handle is taken anew for each call,
   // and it is the loader that gives the same one again.
   if (_documentCache.contains(URL)) return {};
+  XQueryCheckStackFor(*this, stackForLoading);
   const Ref<NSURLLoader> loader = _loader;
   const auto handle = loader->URLHandle(URL, XQueryLoadPurpose::Body, true);
   _URLCache.insert_or_assign(URL, handle);

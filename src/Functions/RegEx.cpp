@@ -1,5 +1,6 @@
 #include "Functions/RegEx.h"
 
+#include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Functions/XQueryRegExCache.h"
 #include "Types/XQueryCasting.h"
@@ -29,7 +30,23 @@ class Strings {
   std::array<Value, most> _values;
 };
 
+// What compiling and searching take at most: so much, and so much more for each open group, of
+// which there are never more than a limit.
+size_t stackFor(NSStringView pattern) {
+  constexpr size_t always = 40 * 1024;
+  constexpr size_t perGroup = 768;
+  constexpr size_t mostGroups = 250;
+  static_assert(always + mostGroups * perGroup <= XQueryMostLibraryStack);
+  size_t groups = 0;
+  for (uint32_t at = pattern.find(u'('); at != NSStringView::notFound && groups < mostGroups;
+       at = pattern.find(u'(', at + 1)) {
+    ++groups;
+  }
+  return always + groups * perGroup;
+}
+
 Ref<XQueryRegEx> compiled(NSStringView pattern, NSStringView flags, XQueryContext& context) {
+  XQueryCheckStackFor(context._internal(), stackFor(pattern));
   std::shared_ptr<XQueryRegExCache>& cache = context._internal().regExCache();
   if (!cache) cache = std::make_shared<XQueryRegExCache>();
   return cache->regExp(pattern, flags);
