@@ -16,6 +16,8 @@ class SettledNodes {
   explicit SettledNodes(bool around) : _around(around) {}
 
   bool holds(const NSObject* item) {
+    // A list within a list comes from the host and may hold anything.
+    if (_around && isa<NSArray>(item)) return false;
     const auto* node = dyn_cast<NSXMLNode>(item);
     if (!node || isInLastTree(node)) return true;
     const NSXMLNode* root = node->rootNode();

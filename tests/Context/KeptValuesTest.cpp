@@ -149,6 +149,9 @@ TEST(KeptValues, WhatIsAroundANodeIsSettledInADocument) {
   EXPECT_TRUE(XQueryAreSettled(std::vector<Value>{root, document, integer(1)}, true));
   EXPECT_TRUE(XQueryAreSettled({&all, 1}, false));
   EXPECT_FALSE(XQueryAreSettled({&all, 1}, true));
+  const Value nested = NSArray::arrayWithObjects({all, root});
+  EXPECT_TRUE(XQueryAreSettled({&nested, 1}, false));
+  EXPECT_FALSE(XQueryAreSettled({&nested, 1}, true));
   // Nodes of one tree may have different roots.
   const auto cut = element("cut");
   root->addChild(cut);
