@@ -1,4 +1,4 @@
-// xquery_bench [--factor=F] [--scaling | --functions] [Google Benchmark options]
+// xquery_bench [--factor=F] [--scaling | --functions | --threads] [Google Benchmark options]
 //
 // Measures the tree build, single steps (some with the memory that each takes at the peak), a table
 // of paths, each beside the peer's figure from the same run, and the queries of bench/queries over
@@ -11,6 +11,7 @@
 #include "PeakMemory.h"
 #include "Peer.h"
 #include "Scaling.h"
+#include "Threads.h"
 
 #include <benchmark/benchmark.h>
 
@@ -260,6 +261,7 @@ std::optional<double> takeFactor(int& argc, char** argv, bool& scaling) {
 int main(int argc, char** argv) {
   if (argc == 3 && std::strcmp(argv[1], "--peak") == 0) return bench::reportPeak(argv[2]);
   if (argc == 2 && std::strcmp(argv[1], "--functions") == 0) return bench::reportFunctions();
+  if (argc == 2 && std::strcmp(argv[1], "--threads") == 0) return bench::reportThreads();
   bool scaling = false;
   const std::optional<double> factor = takeFactor(argc, argv, scaling);
   if (!factor) {

@@ -1,0 +1,13 @@
+// How much more two threads do than one.
+#pragma once
+
+namespace bench {
+
+// For each kind of query, the evaluations per second of a thread alone in its process, and how many
+// times as many two threads make that share the query and the document, and two that have a query
+// and a document each. The exit status of the program: 0 when threads that share make at least 1.8
+// times the evaluations of one, or fall behind those that share nothing by no more than a
+// twentieth where the machine does not give two threads twice the time of one.
+[[nodiscard]] int reportThreads();
+
+}  // namespace bench
