@@ -24,12 +24,13 @@ bool isLocalHost(const std::string& host) {
 // Names from the root on.
 class Names {
  public:
-  void add(std::string name) {
+  void add(std::string_view name) {
     _endsInFolder = name.empty() || name == "." || name == "..";
-    if (!_endsInFolder)
-      _names.push_back(std::move(name));
-    else if (name == ".." && !_names.empty())
+    if (!_endsInFolder) {
+      _names.emplace_back(name);
+    } else if (name == ".." && !_names.empty()) {
       _names.pop_back();
+    }
   }
   std::string path() const {
     std::string text;
@@ -63,10 +64,10 @@ std::optional<std::string> localPathOf(const NSURL& URL) {
   if (!path.starts_with('/')) return std::nullopt;
   Names names;
   const bool isPath = forEachSegment(path, [&](std::string_view segment) {
-    std::string name = unescaped(segment);
+    const std::string name = unescaped(segment);
     constexpr std::string_view inNoName("/\0", 2);
     if (name.find_first_of(inNoName) != name.npos) return false;
-    names.add(std::move(name));
+    names.add(name);
     return true;
   });
   if (!isPath) return std::nullopt;
@@ -76,7 +77,7 @@ std::optional<std::string> localPathOf(const NSURL& URL) {
 std::string withoutDots(std::string_view path) {
   Names names;
   forEachSegment(path, [&](std::string_view segment) {
-    names.add(std::string(segment));
+    names.add(segment);
     return true;
   });
   return names.path();
