@@ -148,7 +148,7 @@ TEST(ExitStatus, AQueryFileThatIsNotUTF8IsThree) {
 
 TEST(ExitStatus, HTMLThatIsRefusedIsThree) {
   std::string tags;
-  for (int n = 0; n < 1'000'000; ++n) tags += "<b>";
+  for (int n = 0; n < 2'000'000; ++n) tags += "<b>";
   const Outcome outcome = xquery({"--html", "-e", "1", "-"}, tags);
   EXPECT_EQ(outcome.status, 3);
   EXPECT_EQ(outcome.out, "");
