@@ -1,6 +1,6 @@
 #include "Expr/Operators/XQueryOperatorExpr.h"
-#include "Expr/XQueryReads.h"
 #include "Expr/Paths/PathTesting.h"
+#include "Expr/XQueryReads.h"
 
 namespace xquery {
 namespace {

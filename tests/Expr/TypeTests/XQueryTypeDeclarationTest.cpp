@@ -1,5 +1,5 @@
-#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/Paths/PathTesting.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryQName.h"
 #include "Types/XQueryString.h"
