@@ -100,8 +100,9 @@ const std::vector<Work>& longWork() {
        megabytes + "let $w := translate($s, '9', '&#233;') for $k in 1 to 1000000 return "
                    "count((upper-case($w), lower-case($w), normalize-unicode($w, 'NFD'), "
                    "translate($w, 'a', $w), translate('a', $w, $w), escape-uri($w, false())))"},
-      {"Codepoints", megabytes + "for $k in 1 to 1000000 return "
-                                 "count(codepoints-to-string(string-to-codepoints($s)))"},
+      {"Codepoints",
+       megabytes + "for $k in 1 to 1000000 return "
+                   "count(codepoints-to-string(string-to-codepoints(substring($s, 1, 300000))))"},
       {"ComparingText", megabytes + "let $t := concat($s, 'x') for $k in 1 to 1000000 where "
                                     "concat($s, 'y') = $t return $k"},
       {"CastingText", megabytes + "for $k in 1 to 1000000 return ($s castable as xs:integer, "
