@@ -20,7 +20,7 @@ using Clock = std::chrono::steady_clock;
 using std::chrono::milliseconds;
 
 // The promise is a tenth of a second; it is kept by what is built for use.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__) || !defined(NDEBUG)
+#if defined(XQUERY_SANITIZED) || !defined(NDEBUG)
 constexpr milliseconds mostLate(1500);
 constexpr milliseconds mostWait(3000);
 #else

@@ -15,7 +15,7 @@ constexpr size_t mebibyte = 1024 * kibibyte;
 
 // AddressSanitizer takes an exception on a stack of more than 64 MiB for a mistake of the program,
 // and needs more of the stack for each level.
-#if defined(__SANITIZE_ADDRESS__)
+#ifdef XQUERY_SANITIZED
 constexpr size_t roomyStack = 60 * mebibyte;
 constexpr int64_t depthOfErrors = 1000;
 constexpr int64_t depthOfLimits = 1000;
@@ -26,7 +26,7 @@ constexpr int64_t depthOfLimits = 20000;
 #endif
 
 // Of processor time, for the deepest recursion there is; of what is built for use.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__) || !defined(NDEBUG)
+#if defined(XQUERY_SANITIZED) || !defined(NDEBUG)
 constexpr double mostSeconds = 10;
 constexpr size_t largeStack = roomyStack;
 #else

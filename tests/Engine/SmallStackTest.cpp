@@ -16,7 +16,7 @@ constexpr size_t kibibyte = 1024;
 constexpr const char* tooDeep = "limit: expression nested too deeply";
 
 // Stacks that a host may give its threads.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#ifdef XQUERY_SANITIZED
 constexpr size_t sizes[] = {1024 * kibibyte};
 #else
 constexpr size_t sizes[] = {64 * kibibyte, 96 * kibibyte, 160 * kibibyte};

@@ -178,7 +178,7 @@ TEST(Object, KindTestsAcceptNull) {
 
 // --- idle memory ---------------------------------------------------------------------------------
 
-#if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+#ifndef XQUERY_SANITIZED
 
 size_t residentBytes() {
   std::ifstream file("/proc/self/statm");

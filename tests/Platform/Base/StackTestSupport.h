@@ -10,7 +10,7 @@
 namespace xquery {
 
 // How much more stack a function takes under sanitizers.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#ifdef XQUERY_SANITIZED
 constexpr size_t sanitizedStackFactor = 4;
 #else
 constexpr size_t sanitizedStackFactor = 1;
