@@ -55,27 +55,10 @@ bool XQueryInScopeNamespaces::updateNamespacesForElement(NSXMLElement& element,
   return true;
 }
 
-bool XQueryInScopeNamespaces::isNewPrefix(const NSXMLElement& element, const NSXMLName* prefix) {
-  constexpr uint32_t few = 16;
-  if (_declared) return _declared->insert(prefix).second;
-  for (const NSXMLNode* other = element.firstNamespace(); other;
-       other = NSXMLElement::nextNamespace(other)) {
-    if (other->nodeName() == prefix) return false;
-  }
-  if (_declaredCount < few) return true;
-  _declared = std::make_unique<std::unordered_set<const NSXMLName*>>();
-  for (const NSXMLNode* other = element.firstNamespace(); other;
-       other = NSXMLElement::nextNamespace(other)) {
-    _declared->insert(other->nodeName());
-  }
-  return _declared->insert(prefix).second;
-}
-
 void XQueryInScopeNamespaces::declare(NSXMLElement& element, NSXMLNode& declaration) {
-  if (!isNewPrefix(element, declaration.nodeName())) return;
+  if (!_declared.insert(declaration.nodeName())) return;
   NSXMLTree::appendProperty(&element, &declaration, _lastDeclared);
   _lastDeclared = &declaration;
-  ++_declaredCount;
 }
 
 // There may be very many: each is linked behind the last one, and a table finds the prefixes that

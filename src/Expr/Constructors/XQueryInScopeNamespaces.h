@@ -1,14 +1,12 @@
 // The namespaces that the constructors being evaluated have declared.
 #pragma once
 
+#include "Platform/Tree/Names.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
 
 #include <cstddef>
-#include <cstdint>
-#include <memory>
-#include <unordered_set>
 #include <vector>
 
 namespace xquery {
@@ -40,13 +38,10 @@ class XQueryInScopeNamespaces {
   void keepNamespaces(NSXMLElement& copy, const NSXMLElement& formerParent);
 
  private:
-  bool isNewPrefix(const NSXMLElement& element, const NSXMLName* prefix);
-
   XQueryContextInternal& _context;
   size_t _count = 0;
   NSXMLNode* _lastDeclared = nullptr;
-  uint32_t _declaredCount = 0;
-  std::unique_ptr<std::unordered_set<const NSXMLName*>> _declared;  // when there are many
+  NSXMLNameSet _declared;
 };
 
 }  // namespace xquery

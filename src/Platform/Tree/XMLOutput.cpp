@@ -14,23 +14,25 @@ constexpr XMLEscapes illegalReplaced() {
   return table;
 }
 
-constexpr XMLEscapes textEscapes() {
+constexpr XMLEscapes markupEscapes() {
   XMLEscapes table = illegalReplaced();
   table['&'] = "&amp;";
   table['<'] = "&lt;";
-  table['>'] = "&gt;";
   table['\r'] = "&#xD;";
   return table;
 }
 
+constexpr XMLEscapes textEscapes() {
+  XMLEscapes table = markupEscapes();
+  table['>'] = "&gt;";
+  return table;
+}
+
 constexpr XMLEscapes attributeEscapes() {
-  XMLEscapes table = illegalReplaced();
-  table['&'] = "&amp;";
-  table['<'] = "&lt;";
+  XMLEscapes table = markupEscapes();
   table['"'] = "&quot;";
   table['\t'] = "&#x9;";
   table['\n'] = "&#xA;";
-  table['\r'] = "&#xD;";
   return table;
 }
 
