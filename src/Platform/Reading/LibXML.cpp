@@ -1,6 +1,7 @@
 #include "Platform/Reading/LibXML.h"
 
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/DeclaredNames.h"
 #include "Platform/Reading/MarkupMeter.h"
 
 #include <libxml/parser.h>
@@ -68,7 +69,7 @@ class Parse {
   static void internalSubset(void* self, const xmlChar* name, const xmlChar* publicID,
                              const xmlChar* systemID);
   static void elementDecl(void* self, const xmlChar*, int, xmlElementContent*);
-  static void attributeDecl(void* self, const xmlChar* element, const xmlChar*, int, int kind,
+  static void attributeDecl(void* self, const xmlChar* element, const xmlChar* name, int, int,
                             const xmlChar* value, xmlEnumeration* tokens);
   static void notationDecl(void* self, const xmlChar*, const xmlChar*, const xmlChar*);
   static void entityDecl(void* self, const xmlChar* name, int type, const xmlChar* publicID,
@@ -395,7 +396,7 @@ void Parse::elementDecl(void* self, const xmlChar*, int, xmlElementContent*) {
   of(self).hasDeclaration(0);
 }
 
-void Parse::attributeDecl(void* self, const xmlChar* element, const xmlChar*, int, int,
+void Parse::attributeDecl(void* self, const xmlChar* element, const xmlChar* name, int, int,
                           const xmlChar* value, xmlEnumeration* tokens) {
   Parse& parse = of(self);
   size_t listed = 0;
@@ -406,6 +407,8 @@ void Parse::attributeDecl(void* self, const xmlChar* element, const xmlChar*, in
     const bool isTooMany = ++parse._attributesDeclared > LibXMLMostAttributesDeclared;
     const bool isDefaultTooMany = value && ++parse._defaults[element] > LibXMLMostAttributes;
     if (isTooMany || isDefaultTooMany) throw LibXMLStop{"too many attributes declared"};
+    const char* const fault = value ? faultOfDefault(viewOf(name), viewOf(value)) : nullptr;
+    if (fault) throw LibXMLStop{fault};
     // Where libxml2 keeps them, what has the same hash is searched one by one.
     checkWork(1 + parse._attributesDeclared / comparisonsPerStep);
   });

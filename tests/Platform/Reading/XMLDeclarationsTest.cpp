@@ -230,6 +230,73 @@ TEST(XMLDeclarations, TextThatItsEncodingDoesNotKnowIsAnError) {
   EXPECT_NE(error.message.find("input conversion failed"), std::string::npos) << error.message;
 }
 
+// --- names ------------------------------------------------------------------------------------
+
+std::string errorOf(const std::string& text) {
+  NSXMLParseError error;
+  return NSXMLDocument::documentWithData(text, 0, &error) ? "" : error.message;
+}
+
+std::string withDefault(const std::string& name, const std::string& value = "v") {
+  return "<!DOCTYPE a [<!ATTLIST a " + name + " CDATA '" + value + "'>]><a xmlns:p='u'/>";
+}
+
+constexpr const char* namespaceOfXML = "http://www.w3.org/XML/1998/namespace";
+constexpr const char* namespaceOfDeclarations = "http://www.w3.org/2000/xmlns/";
+
+TEST(XMLDeclarations, ADefaultedAttributeHasAQualifiedName) {
+  for (const char* name : {"b", "p:b", "xml:b", "p:_", "\xC3\xA9", "p:\xC3\xA9-1", "b\xC2\xB7"}) {
+    EXPECT_EQ(errorOf(withDefault(name)), "") << name;
+  }
+  for (const char* name :
+       {":", ":b", "p:", "p:b:c", "p::b", "xml:2pace", "p:-", "p:.b", "p:\xC2\xB7", "p:\xCC\x80",
+        "p:\xE2\x80\xBF", "xmlns:", "xmlns:p:q", "xmlns:2"}) {
+    EXPECT_EQ(errorOf(withDefault(name)), "a defaulted attribute whose name is no qualified name")
+        << name;
+    // Nothing comes of a declaration without a default.
+    EXPECT_EQ(errorOf("<!DOCTYPE a [<!ATTLIST a " + std::string(name) + " CDATA #IMPLIED>]><a/>"),
+              "")
+        << name;
+  }
+}
+
+TEST(XMLDeclarations, ADefaultedPrefixIsDeclared) {
+  EXPECT_NE(errorOf(withDefault("q:b")).find("Namespace prefix q"), std::string::npos);
+  EXPECT_EQ(errorOf("<!DOCTYPE a [<!ATTLIST a q:b CDATA 'v' xmlns:q CDATA 'u'>]><a/>"), "");
+  EXPECT_NE(errorOf("<!DOCTYPE a [<!ATTLIST a xmlns:q CDATA 'u'>]><a xmlns:p='u' p:b='' q:b=''/>")
+                .find("redefined"),
+            std::string::npos);
+}
+
+TEST(XMLDeclarations, ADefaultedNamespaceDeclarationIsOneThatATagMayHave) {
+  struct Declaration {
+    const char* name;
+    const char* URI;
+    bool isAllowed;
+  };
+  for (const Declaration& each : {
+           Declaration{"xmlns", "", true},
+           Declaration{"xmlns", "u", true},
+           Declaration{"xmlns:q", "u", true},
+           Declaration{"xmlns:xml", namespaceOfXML, true},
+           Declaration{"xmlns", namespaceOfXML, false},
+           Declaration{"xmlns", namespaceOfDeclarations, false},
+           Declaration{"xmlns:q", "", false},
+           Declaration{"xmlns:q", namespaceOfXML, false},
+           Declaration{"xmlns:q", namespaceOfDeclarations, false},
+           Declaration{"xmlns:xml", "u", false},
+           Declaration{"xmlns:xmlns", "u", false},
+           Declaration{"xmlns:xmlns", namespaceOfDeclarations, false},
+       }) {
+    const std::string where = std::string(each.name) + "=" + each.URI;
+    EXPECT_EQ(errorOf(withDefault(each.name, each.URI)),
+              each.isAllowed ? "" : "a defaulted namespace declaration that is not allowed")
+        << where;
+    const std::string given = "<a " + std::string(each.name) + "='" + each.URI + "'/>";
+    EXPECT_EQ(errorOf(given).empty(), each.isAllowed) << where;
+  }
+}
+
 // --- sizes ---------------------------------------------------------------------------------------
 
 std::string repeated(size_t count, const std::function<std::string(size_t)>& part,
@@ -284,11 +351,6 @@ const std::vector<Sized> sizes = {
      },
      LibXMLMostAttributesDeclared, "too many attributes declared"},
 };
-
-std::string errorOf(const std::string& text) {
-  NSXMLParseError error;
-  return NSXMLDocument::documentWithData(text, 0, &error) ? "" : error.message;
-}
 
 TEST(XMLDeclarations, WhatIsComparedWithEachOtherIsBounded) {
   for (const Sized& size : sizes) {
