@@ -13,7 +13,7 @@ need_packages "${packages[@]}" clang libclang-rt-dev || exit 1
 cd "$top/fuzz" || exit 1
 targets=(*.cpp)
 seconds=$(awk -v minutes="$minutes" -v count="${#targets[@]}" \
-  'BEGIN { share = int(minutes * 60 / count); print share > 1 ? share : 1 }')
+  'BEGIN { share = int(minutes * 60 / count); print (share > 1 ? share : 1) }')
 status=0
 for target in "${targets[@]%.cpp}"; do
   out=$top/build/fuzz
