@@ -2,6 +2,7 @@
 
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Reading/DeclaredNames.h"
+#include "Platform/Reading/LibXMLMemory.h"
 #include "Platform/Reading/MarkupMeter.h"
 
 #include <libxml/parser.h>
@@ -15,7 +16,6 @@
 #include <cstring>
 #include <exception>
 #include <memory>
-#include <mutex>
 #include <new>
 #include <unordered_map>
 #include <utility>
@@ -544,6 +544,7 @@ struct FreeParser {
 
 bool Parse::run() {
   const Hearing hearing(*this);
+  const LibXMLValueBytes counted;
   xmlSAXHandler handler = callbacks();
   const std::unique_ptr<xmlParserCtxt, FreeParser> parser(
       xmlCreateIOParserCtxt(&handler, this, readInput, nullptr, this, XML_CHAR_ENCODING_NONE));
@@ -560,8 +561,7 @@ bool Parse::run() {
 }  // namespace
 
 bool parseWithLibXML(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error) {
-  static std::once_flag initialised;
-  std::call_once(initialised, xmlInitParser);
+  LibXMLMemory::begin();
   return Parse(read, handler, error).run();
 }
 

@@ -1,5 +1,5 @@
-// libxml2, as the source of a document's events. Its headers are included here, in LibXMLTree.cpp
-// and in LibXSLT.cpp only.
+// libxml2, as the source of a document's events. Its headers are included here, in
+// LibXMLMemory.cpp, LibXMLTree.cpp and LibXSLT.cpp only.
 //
 // Well-formedness, namespaces, encodings and internal entities are its work. External entities and
 // external DTDs are never read: a reference to one is an error. Depth and the length of texts are

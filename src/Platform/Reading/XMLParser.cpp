@@ -169,6 +169,7 @@ class TreeHandler final : public LibXMLHandler {
 
   void flush();
   bool isPendingKept() const;
+  void gather(std::string_view text);
   void addText(bool isCDATA);
   void setText(NSXMLNode* node, std::string_view text);
   // The text in the arena.
@@ -184,7 +185,8 @@ class TreeHandler final : public LibXMLHandler {
   NameCache _names;
   std::unordered_map<LibXMLText, NSStringView> _URIs;
   std::vector<SpaceChange> _spaceChanges;
-  std::string _pending;          // text not yet stored, UTF-8
+  std::string _pending;  // text not yet stored, UTF-8
+  CountedBytes _pendingBytes;
   bool _pendingIsExact = false;  // some of it came from a CDATA section: kept whatever it is
 };
 
@@ -212,6 +214,12 @@ NSStringView TreeHandler::storedURI(LibXMLText URI) {
   return place->second;
 }
 
+void TreeHandler::gather(std::string_view text) {
+  const size_t before = _pending.capacity();
+  _pending.append(text);
+  if (_pending.capacity() != before) _pendingBytes.set(_pending.capacity());
+}
+
 bool TreeHandler::isPendingKept() const {
   return _keepsWhitespace || _pendingIsExact ||
          _pending.find_first_not_of(whiteSpace) != std::string::npos;
@@ -223,7 +231,10 @@ void TreeHandler::addText(bool isCDATA) {
   if (isCDATA) NSXMLTree::setCDATA(node);
   // A huge text must not hold its memory a second time until the end.
   constexpr size_t kept = size_t{1} << 20;
-  if (_pending.capacity() > kept) std::string().swap(_pending);
+  if (_pending.capacity() > kept) {
+    std::string().swap(_pending);
+    _pendingBytes.set(0);
+  }
   _pending.clear();
   _pendingIsExact = false;
 }
@@ -278,17 +289,17 @@ void TreeHandler::endElement() {
 }
 
 void TreeHandler::characters(std::string_view text) {
-  _pending.append(text);
+  gather(text);
 }
 
 void TreeHandler::CDATA(std::string_view text) {
   if (text.empty()) return;
   if (_keepsCDATA) {
     flush();
-    _pending.assign(text);
+    gather(text);
     addText(true);
   } else {
-    _pending.append(text);
+    gather(text);
     _pendingIsExact = true;
   }
 }

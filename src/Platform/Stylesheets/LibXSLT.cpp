@@ -2,6 +2,7 @@
 
 #include "Platform/Base/WorkerThread.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/LibXMLMemory.h"
 #include "Platform/Stylesheets/LibXMLTree.h"
 #include "Platform/Stylesheets/StylesheetBounds.h"
 
@@ -9,7 +10,6 @@
 #include <libxml/parser.h>
 #include <libxml/tree.h>
 #include <libxml/xmlerror.h>
-#include <libxml/xmlmemory.h>
 #include <libxslt/documents.h>
 #include <libxslt/imports.h>
 #include <libxslt/security.h>
@@ -24,10 +24,8 @@
 #include <condition_variable>
 #include <cstdarg>
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
 #include <exception>
-#include <malloc.h>
 #include <memory>
 #include <mutex>
 #include <new>
@@ -67,7 +65,8 @@ using Context = std::unique_ptr<xsltTransformContext, Freed<xsltFreeTransformCon
 using Security = std::unique_ptr<xsltSecurityPrefs, Freed<xsltFreeSecurityPrefs>>;
 
 // Owned by the caller and by the thread that does the work, whichever lives longer.
-class Transformation : public std::enable_shared_from_this<Transformation> {
+class Transformation final : public std::enable_shared_from_this<Transformation>,
+                             private LibXMLMemory::Counter {
  public:
   explicit Transformation(const LibXSLTTask& task);
   Value run(std::string& failure);
@@ -77,9 +76,10 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
   void hear(const char* format, va_list arguments);
   void hear(const char* text);
   void noteNode();
-  void noteBytes(int64_t more);
 
  private:
+  void noteBytes(int64_t more) override;
+
   // As long as it lives, what libxml2 has taken is part of what the calling thread has taken, so
   // that whatever looks at that sees all.
   class TakenTogether {
@@ -156,63 +156,6 @@ class Transformation : public std::enable_shared_from_this<Transformation> {
 // The transformation of this thread.
 thread_local Transformation* current = nullptr;
 
-// That which what this thread asks of libxml2 is for.
-thread_local Transformation* counted = nullptr;
-
-// Stands between libxml2 and malloc to count what transformations take. Texts grow by doubling as
-// easily as trees do, and nothing else tells how long they are. Nothing is refused here, since
-// libxml2 does not come out of every such refusal well.
-class Counting {
- public:
-  // Of the blocks of another allocator, which a host may have given to libxml2, sizes are unknown.
-  static void begin() { replace({std::free, std::malloc, std::realloc}, {free, malloc, realloc}); }
-  static void end() { replace({free, malloc, realloc}, {std::free, std::malloc, std::realloc}); }
-
- private:
-  struct Functions {
-    xmlFreeFunc free;
-    xmlMallocFunc malloc;
-    xmlReallocFunc realloc;
-    bool operator==(const Functions&) const = default;
-  };
-
-  static void replace(const Functions& before, const Functions& after) {
-    Functions found;
-    xmlStrdupFunc strdup;  // takes its memory from the others
-    xmlMemGet(&found.free, &found.malloc, &found.realloc, &strdup);
-    if (found == before) xmlMemSetup(after.free, after.malloc, after.realloc, strdup);
-  }
-  static int64_t sizeOf(void* block) { return static_cast<int64_t>(malloc_usable_size(block)); }
-
-  static void* malloc(size_t size) {
-    void* const block = std::malloc(size);
-    if (counted) counted->noteBytes(sizeOf(block));
-    return block;
-  }
-  static void* realloc(void* block, size_t size) {
-    const int64_t before = counted ? sizeOf(block) : 0;
-    void* const moved = std::realloc(block, size);
-    if (counted && moved) counted->noteBytes(sizeOf(moved) - before);
-    return moved;
-  }
-  static void free(void* block) {
-    if (counted) counted->noteBytes(-sizeOf(block));
-    std::free(block);
-  }
-};
-
-// Threads that nobody waits for any more. libxml2 releases what it shares when the process ends,
-// whoever still uses it, unless its memory comes from somebody else: where there are such threads
-// the allocator stays ours. Nor does the process wait for them.
-class LeftBehind {
- public:
-  ~LeftBehind() {
-    if (count == 0) Counting::end();
-  }
-  std::atomic<int> count = 0;
-};
-LeftBehind leftBehind;
-
 // --- what libxslt keeps for the whole process ----------------------------------------------------
 
 // A host may use libxslt for itself: what does not belong to a transformation of ours goes on to
@@ -249,8 +192,7 @@ void noteNode(xmlNodePtr) {
 }
 
 void initialise() {
-  xmlInitParser();
-  Counting::begin();
+  LibXMLMemory::begin();
   xsltInit();
   otherLoader = xsltDocDefaultLoader;
   xsltSetLoaderFunc(loadDocument);
@@ -272,19 +214,20 @@ void* Transformation::start(void* self) {
   const bool wasLeftBehind = transformation->finish();
   transformation.reset();
   // Not before, since what it freed is libxml2's.
-  if (wasLeftBehind) --leftBehind.count;
+  if (wasLeftBehind) --LibXMLMemory::threadsLeftBehind();
   return nullptr;
 }
 
 void Transformation::work() {
   _stackTop = static_cast<const char*>(__builtin_frame_address(0));
-  current = counted = this;
+  current = this;
+  const LibXMLMemory::CountedBy counting(*this);
   // These three are of the thread and go with it.
   xmlSetStructuredErrorFunc(nullptr, hearStructuredError);
   xmlSetGenericErrorFunc(nullptr, hearError);
   xmlRegisterNodeDefaultValue = xquery::noteNode;
   if (const Stylesheet stylesheet = compile()) apply(*stylesheet);
-  current = counted = nullptr;
+  current = nullptr;
 }
 
 bool Transformation::finish() {
@@ -445,7 +388,7 @@ bool Transformation::attend() {
     }
     if (_isDone || Clock::now() < lastMoment) continue;
     _isLeftBehind = true;
-    ++leftBehind.count;
+    ++LibXMLMemory::threadsLeftBehind();
     return false;
   }
 }
@@ -492,11 +435,7 @@ LibXMLDocument Transformation::copyOfStylesheet(const NSXMLDocument& document,
 
 LibXMLDocument Transformation::copyOf(const NSXMLDocument& document, size_t mostLevels,
                                       const std::string& URL, xmlDictPtr dictionary) {
-  struct Counted {
-    explicit Counted(Transformation* transformation) { counted = transformation; }
-    ~Counted() { counted = nullptr; }
-  };
-  const Counted counting(this);
+  const LibXMLMemory::CountedBy counting(*this);
   return LibXMLDocumentFrom(document, mostLevels, URL, dictionary);
 }
 
@@ -517,7 +456,7 @@ Value Transformation::run(std::string& failure) {
   copyTask();
   failure = _refusal ? _refusal : "the document nests too deeply";
   if (!_document || !_stylesheet) return nullptr;
-  while (leftBehind.count >= LibXSLTMostLeftBehind) {
+  while (LibXMLMemory::threadsLeftBehind() >= LibXSLTMostLeftBehind) {
     lookAtWork();
     std::this_thread::sleep_for(timeBetweenLooks);
   }

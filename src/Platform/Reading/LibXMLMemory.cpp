@@ -1,0 +1,98 @@
+#include "Platform/Reading/LibXMLMemory.h"
+
+#include "Platform/Base/WorkMeter.h"
+
+#include <libxml/parser.h>
+#include <libxml/xmlmemory.h>
+
+#include <cstdlib>
+#include <malloc.h>
+#include <mutex>
+
+namespace xquery {
+
+namespace {
+
+constinit thread_local LibXMLMemory::Counter* counter __attribute__((tls_model("initial-exec"))) =
+    nullptr;
+
+int64_t sizeOf(void* block) {
+  return static_cast<int64_t>(malloc_usable_size(block));
+}
+
+void* countingMalloc(size_t size) {
+  void* const block = std::malloc(size);
+  if (counter) counter->noteBytes(sizeOf(block));
+  return block;
+}
+
+void* countingRealloc(void* block, size_t size) {
+  const int64_t before = counter ? sizeOf(block) : 0;
+  void* const moved = std::realloc(block, size);
+  if (counter && moved) counter->noteBytes(sizeOf(moved) - before);
+  return moved;
+}
+
+void countingFree(void* block) {
+  if (counter) counter->noteBytes(-sizeOf(block));
+  std::free(block);
+}
+
+struct Functions {
+  xmlFreeFunc free;
+  xmlMallocFunc malloc;
+  xmlReallocFunc realloc;
+  bool operator==(const Functions&) const = default;
+};
+
+constexpr Functions plain = {std::free, std::malloc, std::realloc};
+constexpr Functions counting = {countingFree, countingMalloc, countingRealloc};
+
+void replace(const Functions& before, const Functions& after) {
+  Functions found;
+  xmlStrdupFunc strdup;  // takes its memory from the others
+  xmlMemGet(&found.free, &found.malloc, &found.realloc, &strdup);
+  if (found == before) xmlMemSetup(after.free, after.malloc, after.realloc, strdup);
+}
+
+struct LeftBehind {
+  ~LeftBehind() {
+    if (count == 0) replace(counting, plain);
+  }
+  std::atomic<int> count = 0;
+};
+LeftBehind leftBehind;
+
+}  // namespace
+
+LibXMLMemory::CountedBy::CountedBy(Counter& one) : _outer(counter) {
+  counter = &one;
+}
+
+LibXMLMemory::CountedBy::~CountedBy() {
+  counter = _outer;
+}
+
+void LibXMLMemory::begin() {
+  static std::once_flag begun;
+  std::call_once(begun, [] {
+    xmlInitParser();
+    replace(plain, counting);
+  });
+}
+
+std::atomic<int>& LibXMLMemory::threadsLeftBehind() {
+  return leftBehind.count;
+}
+
+LibXMLValueBytes::~LibXMLValueBytes() {
+  workMeter.valueBytes -= _bytes;
+}
+
+void LibXMLValueBytes::noteBytes(int64_t more) {
+  _bytes += more;
+  workMeter.valueBytes += more;
+  if (workMeter.valueBytes > workMeter.mostValueBytes) workMeter.stepsLeft = 0;
+}
+
+}  // namespace xquery
