@@ -106,7 +106,8 @@ class XQUERY_EXPORT XQueryClient {
 //   - what the host gave it: client, namespaces, loading settings, limits
 //   - the context item, which stays in force for an evaluation that is given none
 //   - the clock: current-dateTime and its kin answer the moment when the context was first asked
-//   - the documents that fn:doc loaded, and which URLs gave none: neither is fetched again
+//   - the documents that fn:doc loaded, and which URLs gave none: neither is fetched again,
+//     but where such URLs come to more than 4 MiB all of them are forgotten between evaluations
 //   - the base URIs recorded for constructed nodes, and its last error
 //
 // One context for many evaluations is right for one task over documents that do not change, such as
@@ -165,7 +166,7 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
 
   // How documents, raw bodies and stylesheets are fetched from now on; at first any file, http and
   // https URL is. A document is fetched once in the life of a context, and one that could not be
-  // had stays missing, whatever the settings are later.
+  // had stays missing, whatever the settings are later, unless it was one of very many.
   void contextSetLoading(const XQueryLoading& loading);
   const XQueryLoading& contextLoading() const;
   // What each of the following evaluations may take; one that is under way keeps what was set when

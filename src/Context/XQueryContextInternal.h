@@ -96,11 +96,15 @@ class XQueryContextInternal {
 
   // --- documents and bodies ----------------------------------------------------------------------
   // What the URL names, parsed as XML or HTML without text of white space only; NSNull when it
-  // cannot be had. Fetched once: the first answer, a failure included, is the answer for good.
+  // cannot be had. Fetched once: the first answer, a failure included, is the answer for good,
+  // unless too many failures were forgotten.
   Value XQueryDocumentForURL(const Ref<NSURL>& URL);
   // The raw bytes; null when they cannot be had. What was loaded as a document, or could not be,
   // has none.
   Ref<NSData> URLBody(const Ref<NSURL>& URL);
+  // Between evaluations: forgets the failures when they take more than a context may keep. Other
+  // documents are wanted again, but any number of URLs can be made up that name nothing.
+  void forgetManyFailures();
   NSURLLoader& loader() const { return *_loader; }
   void setLoading(const XQueryLoading& loading);
 
@@ -164,6 +168,7 @@ class XQueryContextInternal {
   std::map<std::string, Ref<NSString>> _contextNamespaces;
   Ref<NSURLLoader> _loader;
   NSURLTable<Value> _documentCache;  // documents, NSNull for failures
+  size_t _failureBytes = 0;          // of URLs that named no document
   NSURLTable<Ref<NSURLHandle>> _URLCache;
   XQueryKeptValues _keptValues;
   Ref<XQueryError> _error;

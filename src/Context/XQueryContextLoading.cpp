@@ -20,6 +20,14 @@ static_assert(XMLOptions == 0x1000006 && HTMLOptions == 0x1000206);
 constexpr size_t stackForLoading = size_t{80} * 1024;
 static_assert(stackForLoading <= XQueryMostLibraryStack);
 
+// What is kept of failures from one evaluation to the next: some ten thousand URLs of usual length.
+constexpr size_t mostFailureBytes = size_t{4} << 20;
+
+size_t bytesOf(const NSURL& URL) {
+  constexpr size_t besidesText = 256;
+  return besidesText + URL.absoluteString()->length();
+}
+
 bool isHTML(const XQueryResource& resource, const NSURL& URL) {
   if (resource.MIMEType && lowerCase(*resource.MIMEType) == "text/html") return true;
   const std::string path = lowerCase(URL.relativePath());
@@ -52,7 +60,15 @@ Value XQueryContextInternal::XQueryDocumentForURL(const Ref<NSURL>& URL) {
   // A document that a limit kept from being made is not missing.
   lookAtWork();
   _documentCache.insert_or_assign(URL, result);
+  if (result == NSNull::null()) _failureBytes += bytesOf(*URL);
   return result;
+}
+
+void XQueryContextInternal::forgetManyFailures() {
+  if (_failureBytes <= mostFailureBytes) return;
+  std::erase_if(_documentCache, [](const auto& entry) { return entry.second == NSNull::null(); });
+  _documentCache.rehash(0);
+  _failureBytes = 0;
 }
 
 Ref<NSData> XQueryContextInternal::URLBody(const Ref<NSURL>& URL) {
@@ -62,8 +78,14 @@ Ref<NSData> XQueryContextInternal::URLBody(const Ref<NSURL>& URL) {
   XQueryCheckStackFor(*this, stackForLoading);
   const Ref<NSURLLoader> loader = _loader;
   const auto handle = loader->URLHandle(URL, XQueryLoadPurpose::Body, true);
-  _URLCache.insert_or_assign(URL, handle);
-  return handle->resourceData(*loader);
+  Ref<NSData> data = handle->resourceData(*loader);
+  // A handle that holds nothing would be tried again.
+  if (data) {
+    _URLCache.insert_or_assign(URL, handle);
+  } else {
+    loader->forget(URL, XQueryLoadPurpose::Body);
+  }
+  return data;
 }
 
 }  // namespace xquery

@@ -200,6 +200,7 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   const NSXMLEra era;
   context._clearGlobals();
   context.keptValues().clear();
+  context.forgetManyFailures();
   if (contextItem && !isNull(contextItem)) context.setContextItem(contextItem, 1);
   XQueryProlog& prolog = *compiled.prolog();
   context.setOrdered(prolog.ordered());
@@ -207,6 +208,7 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   const Value result = evaluateModule(compiled, constants);
   context._clearGlobals();
   context.keptValues().clear();
+  context.forgetManyFailures();
   return shapedResult(result, error);
 }
 

@@ -336,6 +336,9 @@ class HostLoading : public Loading {
     settings.policy = XQueryLoadingPolicy::denyAll().allowScheme("app");
     context->contextSetLoading(settings);
   }
+  bool isEvaluated(const XQuery& query) {
+    return bool(context->evaluateXQuery(query, {}, nullptr, nullptr));
+  }
   std::shared_ptr<Archive> archive = std::make_shared<Archive>();
   XQueryLoading settings;
 };
@@ -357,6 +360,49 @@ TEST_F(HostLoading, GivesDocumentsModulesAndBodies) {
       {"app:b", XQueryLoadPurpose::Body},
       {"app:m", XQueryLoadPurpose::Module}};
   EXPECT_EQ(archive->asked, expected);
+}
+
+// 200 documents that nobody has, asked for twice each; the whole of their URLs is 10 MiB.
+constexpr const char* manyMissing =
+    "let $long := string-join(for $i in 1 to 50000 return 'a', '')"
+    " return count(for $turn in 1 to 2, $i in 1 to 200 return doc(concat('app:', $i, $long)))";
+
+TEST_F(HostLoading, ManyFailuresAreForgottenAfterAnEvaluation) {
+  const auto missing = XQuery::xqueryWithSource(manyMissing);
+  const int64_t before = workMeter.valueBytes;
+  for (size_t turn = 1; turn <= 3; ++turn) {
+    archive->asked.clear();
+    EXPECT_TRUE(isEvaluated(*missing));
+    EXPECT_EQ(archive->asked.size(), 200u) << turn;
+    EXPECT_LT(workMeter.valueBytes - before, 1 << 20) << turn;
+  }
+}
+
+TEST_F(HostLoading, SomeFailuresAndEveryDocumentAreKept) {
+  archive->entries["app:d"] = {"<a/>", {}, {}, {}};
+  const auto few =
+      XQuery::xqueryWithSource("count(for $i in 1 to 200 return doc(concat('app:', $i)))");
+  const auto document = XQuery::xqueryWithSource("exists(doc('app:d'))");
+  for (int turn = 0; turn < 2; ++turn) {
+    EXPECT_TRUE(isEvaluated(*few));
+    EXPECT_TRUE(isEvaluated(*document));
+  }
+  EXPECT_EQ(archive->asked.size(), 201u);
+  EXPECT_TRUE(isEvaluated(*XQuery::xqueryWithSource(manyMissing)));
+  archive->asked.clear();
+  EXPECT_TRUE(isEvaluated(*document));
+  EXPECT_TRUE(archive->asked.empty());
+  EXPECT_TRUE(isEvaluated(*few));
+  EXPECT_EQ(archive->asked.size(), 200u);
+}
+
+TEST_F(HostLoading, BodiesThatAreMissingAreNotKept) {
+  const int64_t before = workMeter.valueBytes;
+  const std::string text(50000, 'a');
+  for (int index = 0; index < 100; ++index) {
+    EXPECT_EQ(body("app:" + std::to_string(index) + text), "(none)");
+  }
+  EXPECT_LT(workMeter.valueBytes - before, 1 << 20);
 }
 
 TEST_F(HostLoading, MayChangeTheSettingsWhileItIsCalled) {

@@ -175,4 +175,8 @@ Ref<NSURLHandle> NSURLLoader::URLHandle(const Ref<NSURL>& URL, XQueryLoadPurpose
   return handle;
 }
 
+void NSURLLoader::forget(const Ref<NSURL>& URL, XQueryLoadPurpose purpose) {
+  _handles[static_cast<size_t>(purpose)].erase(URL);
+}
+
 }  // namespace xquery

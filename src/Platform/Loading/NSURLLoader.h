@@ -71,6 +71,8 @@ class NSURLLoader : public NSCounted {
 
   // With `usingCache` the same handle for the same URL and purpose as long as this loader lives.
   Ref<NSURLHandle> URLHandle(const Ref<NSURL>& URL, XQueryLoadPurpose purpose, bool usingCache);
+  // The next handle is another one.
+  void forget(const Ref<NSURL>& URL, XQueryLoadPurpose purpose);
 
  protected:
   explicit NSURLLoader(XQueryLoading loading);
