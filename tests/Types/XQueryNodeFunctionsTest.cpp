@@ -270,7 +270,7 @@ double secondsToCompareAttributes(size_t count) {
 }
 
 TEST(NodeEqual, ManyAttributesAreFoundByName) {
-  EXPECT_TRUE(growsInProportion(secondsToCompareAttributes, 5900));
+  EXPECT_TRUE(growsInProportion(secondsToCompareAttributes, 6000));
 }
 
 TEST(NodeEqual, ANodeIsEqualToItselfAndToNoOtherKind) {

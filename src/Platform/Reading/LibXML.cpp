@@ -301,7 +301,7 @@ const char* Parse::excess(const MarkupMeter& meter) const {
   const auto namespaces = static_cast<size_t>(_parser->nsNr) / 2;
   if (meter.mostAttributes() > LibXMLMostAttributes) return "too many attributes";
   if (namespaces > LibXMLMostNamespaces) return "too many namespaces";
-  if (meter.mostAttributes() * namespaces > LibXMLMostLookups) return "too many namespaces";
+  if (meter.mostNamed() * namespaces > LibXMLMostLookups) return "too many namespaces";
   if (meter.mostListed() + _listedInEntities > LibXMLMostListed) {
     return "too many names in a declaration";
   }
@@ -405,7 +405,7 @@ void Parse::attributeDecl(void* self, const xmlChar* element, const xmlChar* nam
   parse.hasDeclaration(listed);
   parse.guarded([&] {
     const bool isTooMany = ++parse._attributesDeclared > LibXMLMostAttributesDeclared;
-    const bool isDefaultTooMany = value && ++parse._defaults[element] > LibXMLMostAttributes;
+    const bool isDefaultTooMany = value && ++parse._defaults[element] > LibXMLMostDefaults;
     if (isTooMany || isDefaultTooMany) throw LibXMLStop{"too many attributes declared"};
     const char* const fault = value ? faultOfDefault(viewOf(name), viewOf(value)) : nullptr;
     if (fault) throw LibXMLStop{fault};

@@ -18,36 +18,19 @@ void MarkupMeter::restart(Place place) {
   _state = _around = beginning.state;
   _ending = beginning.ending;
   _matched = _depth = 0;
-  _attributes = _listed = 0;
-  _mostAttributes = _mostListed = 0;
+  _attributes = _named = _listed = 0;
+  _mostAttributes = _mostNamed = _mostListed = 0;
 }
 
 void MarkupMeter::read(std::string_view text) {
-  for (size_t at = 0; at < text.size();) {
-    switch (_state) {
-      case State::Content:
-        at = readContent(text, at);
-        break;
-      case State::Less:
-      case State::Exclamation:
-        at = readOpening(text, at);
-        break;
-      case State::Tag:
-        at = readTag(text, at);
-        break;
-      case State::Declaration:
-        at = readDeclaration(text, at);
-        break;
-      case State::Literal:
-        at = readLiteral(text, at);
-        break;
-      case State::Passed:
-        at = readPassed(text, at);
-        break;
-      case State::Beyond:
-        return;
-    }
-  }
+  using Step = size_t (MarkupMeter::*)(std::string_view text, size_t at);
+  // In the order of the states.
+  static constexpr Step steps[] = {
+      &MarkupMeter::readContent, &MarkupMeter::readOpening,     &MarkupMeter::readOpening,
+      &MarkupMeter::readTag,     &MarkupMeter::readDeclaration, &MarkupMeter::readLiteral,
+      &MarkupMeter::readPassed,  &MarkupMeter::readBeyond,
+  };
+  for (size_t at = 0; at < text.size();) at = (this->*steps[static_cast<size_t>(_state)])(text, at);
 }
 
 size_t MarkupMeter::readContent(std::string_view text, size_t at) {
@@ -65,7 +48,7 @@ size_t MarkupMeter::readOpening(std::string_view text, size_t at) {
   }
   if (_state == State::Less && byte != '?') {
     _state = State::Tag;
-    _attributes = 0;
+    _attributes = _named = 0;
     return at;
   }
   if (byte == '?') {
@@ -81,12 +64,24 @@ size_t MarkupMeter::readOpening(std::string_view text, size_t at) {
   return at + 1;
 }
 
+// Of the attribute whose "=" is there; a name that began in an earlier piece is not recognised.
+bool isNamespaceDeclaration(std::string_view text, size_t equals) {
+  constexpr std::string_view whiteSpace = " \t\r\n";
+  constexpr std::string_view xmlns = "xmlns";
+  const size_t end = text.substr(0, equals).find_last_not_of(whiteSpace);
+  const size_t before = text.find_last_of(whiteSpace, end);
+  if (end == text.npos || before == text.npos) return false;
+  const std::string_view name = text.substr(before + 1, end - before);
+  return name == xmlns || (name.starts_with(xmlns) && name[xmlns.size()] == ':');
+}
+
 size_t MarkupMeter::readTag(std::string_view text, size_t at) {
   const size_t found = text.find_first_of("=\"'>", at);
   if (found == text.npos) return text.size();
   switch (text[found]) {
     case '=':
       _mostAttributes = std::max(_mostAttributes, ++_attributes);
+      if (!isNamespaceDeclaration(text, found)) _mostNamed = std::max(_mostNamed, ++_named);
       break;
     case '>':
       _state = State::Content;
@@ -156,6 +151,10 @@ size_t MarkupMeter::readPassed(std::string_view text, size_t at) {
     _matched = 0;
   }
   return at + 1;
+}
+
+size_t MarkupMeter::readBeyond(std::string_view text, size_t) {
+  return text.size();
 }
 
 }  // namespace xquery

@@ -24,6 +24,8 @@ class MarkupMeter {
 
   // Of the largest tag, or of what has come of it so far; "=" outside of literals.
   size_t mostAttributes() const { return _mostAttributes; }
+  // The same without declarations of namespaces: those whose prefixes are looked up.
+  size_t mostNamed() const { return _mostNamed; }
   // Of the largest list in parentheses; "|" and "," in it.
   size_t mostListed() const { return _mostListed; }
 
@@ -46,6 +48,7 @@ class MarkupMeter {
   size_t readDeclaration(std::string_view text, size_t at);
   size_t readLiteral(std::string_view text, size_t at);
   size_t readPassed(std::string_view text, size_t at);
+  size_t readBeyond(std::string_view text, size_t at);
   void openLiteral(std::string_view quote);
   void pass(std::string_view ending);
 
@@ -55,8 +58,10 @@ class MarkupMeter {
   size_t _matched;  // of the ending
   size_t _depth;    // of parentheses
   size_t _attributes;
+  size_t _named;
   size_t _listed;
   size_t _mostAttributes;
+  size_t _mostNamed;
   size_t _mostListed;
 };
 

@@ -35,6 +35,23 @@ TEST(MarkupMeter, CountsTheAttributesOfTheLargestTag) {
   expectMeasure("text = = '= <a x='1' y='", Place::Content, 2, 0);
 }
 
+TEST(MarkupMeter, TellsDeclarationsOfNamespacesFromOtherAttributes) {
+  const auto named = [](std::string_view text) {
+    MarkupMeter meter;
+    meter.read(text);
+    return meter.mostNamed();
+  };
+  EXPECT_EQ(named("<a xmlns='u' xmlns:p='v' p:b='w'\n\txmlns:q \n= 'x' c = 'y'/>"), 2u);
+  EXPECT_EQ(named("<a xmlnsb='1' xmlns.='2' p:xmlns='3' b='xmlns:c='/>"), 4u);
+  EXPECT_EQ(named("<a b='1' c='2'/><a xmlns:b='1' xmlns:c='2' d='3'/>"), 2u);
+  MarkupMeter meter;
+  for (const char* piece : {"<a xml", "ns:p='u' xmlns:q", "='v' xmlns:r", " = 'w'/>"}) {
+    meter.read(piece);
+  }
+  EXPECT_EQ(meter.mostAttributes(), 3u);
+  EXPECT_LE(meter.mostNamed(), 3u);
+}
+
 TEST(MarkupMeter, CountsTheNamesOfTheLargestList) {
   expectMeasure("<!ATTLIST a x (b|c|d) 'b' y (b|c) \"(|||||)\">", Place::Content, 0, 2);
   expectMeasure("<!ELEMENT a (b,(c|d)?,(e,f)*)><!ELEMENT b (c)>", Place::Content, 0, 4);

@@ -344,7 +344,7 @@ const std::vector<Sized> sizes = {
      [](size_t n) {
        return "<!ATTLIST a " + repeated(n, [](size_t i) { return name(i) + " CDATA 'v' "; }) + ">";
      },
-     LibXMLMostAttributes, "too many attributes declared"},
+     LibXMLMostDefaults, "too many attributes declared"},
     {"attribute lists",
      [](size_t n) {
        return repeated(n, [](size_t i) { return "<!ATTLIST " + name(i) + " x CDATA 'v'>"; });
