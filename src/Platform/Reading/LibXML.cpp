@@ -29,7 +29,8 @@ namespace {
 // end of an evaluation that the parse is part of is thrown on, when libxml2 has returned: it is
 // looked for when input is read and when entities and defaults, which need no reading, add to the
 // document. The content of an entity is parsed by an inner parser of libxml2's, which calls the
-// same functions.
+// same functions with itself in place of the outer one, and is stopped by its next call when the
+// parse has failed.
 //
 // What libxml2 hands to whoever hears its errors depends on the way the report takes: what belongs
 // to the parser, to its validation context (the parser itself), or to nobody, such as failures of
@@ -42,10 +43,12 @@ class Parse {
 
  private:
   static xmlSAXHandler callbacks();
-  static Parse& of(void* self) { return *static_cast<Parse*>(self); }
+  // What calls back is a parser, from here on the one at work.
+  static Parse& of(void* parser);
   class Hearing;
   template <class Function>
   void guarded(Function function);
+  void stop();
   void fail(const char* message);
   void failAt(const char* message, int64_t line, int64_t column);
   void note(const char* message, int64_t line, int64_t column);  // the first failure counts
@@ -97,6 +100,7 @@ class Parse {
   LibXMLHandler& _handler;
   NSXMLParseError& _error;
   xmlParserCtxt* _parser = nullptr;
+  xmlParserCtxt* _atWork = nullptr;  // the same, or the one of an entity's content
   size_t _bytesRead = 0;
   size_t _bytesAdded = 0;
   MarkupMeter _meter;  // of what came since the last event, if measuring
@@ -142,9 +146,23 @@ void Parse::end(std::exception_ptr exception) {
   note("the evaluation has ended", 0, 0);
 }
 
+Parse& Parse::of(void* self) {
+  auto* const parser = static_cast<xmlParserCtxt*>(self);
+  Parse& parse = *static_cast<Parse*>(parser->_private);
+  parse._atWork = parser;
+  if (parse._failed) xmlStopParser(parser);
+  return parse;
+}
+
+// Parsers between these two stop at their next calls.
+void Parse::stop() {
+  xmlStopParser(_parser);
+  if (_atWork != _parser) xmlStopParser(_atWork);
+}
+
 void Parse::failAt(const char* message, int64_t line, int64_t column) {
   note(message, line, column);
-  xmlStopParser(_parser);
+  stop();
 }
 
 void Parse::fail(const char* message) {
@@ -163,7 +181,7 @@ void Parse::guarded(Function function) {
     fail(outOfMemory);
   } catch (...) {
     end(std::current_exception());
-    xmlStopParser(_parser);
+    stop();
   }
 }
 
@@ -213,6 +231,8 @@ void Parse::hear(const xmlError& error) {
   // What concerns the input is heard while it is read, when the parser cannot be stopped.
   const bool isOfInput =
       !_parser || (error.domain != XML_FROM_PARSER && error.domain != XML_FROM_NAMESPACE);
+  // Nor can the parser that was at work last, which may be gone.
+  if (_parser) _atWork = _parser;
   if (!isOfInput) return failAt(error.message, error.line, error.int2);
   const xmlParserInput* input = _parser ? _parser->input : nullptr;
   note(error.message, input ? input->line : 0, input ? input->col : 0);
@@ -223,7 +243,7 @@ void Parse::hear(const xmlError& error) {
 // The parser cannot be stopped here, since stopping frees the buffer that is being filled; after a
 // failure it sees the end of the input.
 int Parse::readInput(void* self, char* buffer, int size) {
-  Parse& parse = of(self);
+  Parse& parse = *static_cast<Parse*>(self);
   if (parse._failed || parse._reachedEnd) return 0;
   ptrdiff_t count = -1;
   try {
@@ -547,11 +567,13 @@ bool Parse::run() {
   const LibXMLValueBytes counted;
   xmlSAXHandler handler = callbacks();
   const std::unique_ptr<xmlParserCtxt, FreeParser> parser(
-      xmlCreateIOParserCtxt(&handler, this, readInput, nullptr, this, XML_CHAR_ENCODING_NONE));
+      xmlCreateIOParserCtxt(&handler, nullptr, readInput, nullptr, this, XML_CHAR_ENCODING_NONE));
   if (!parser) throw std::bad_alloc();
-  _parser = parser.get();
+  _parser = _atWork = parser.get();
+  _parser->_private = this;
   xmlCtxtUseOptions(_parser, XML_PARSE_HUGE | XML_PARSE_NOENT | XML_PARSE_NONET);
   const bool isWellFormed = xmlParseDocument(_parser) == 0 && _parser->wellFormed;
+  _atWork = _parser;
   if (!_failed && !isWellFormed) fail(nullptr);
   if (!_failed && !hasReadAll()) fail("extra content at the end of the document");
   if (_ended) std::rethrow_exception(_ended);

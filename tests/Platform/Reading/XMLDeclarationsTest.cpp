@@ -2,10 +2,12 @@
 // of them ends.
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Reading/LibXML.h"
+#include "Platform/Reading/LibXMLMemory.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
 #include <libxml/xmlerror.h>
+#include <libxml/xmlmemory.h>
 
 #include <functional>
 #include <memory>
@@ -203,6 +205,84 @@ TEST(XMLDeclarations, ReadingMayBeEndedAtEveryLook) {
     }
   }
   EXPECT_GT(looks, 4);
+}
+
+// How often libxml2 asks for memory while this lives: a comment needs some.
+class Requests {
+ public:
+  Requests() {
+    LibXMLMemory::begin();
+    xmlMemGet(&free, &malloc, &realloc, &strdup);
+    requests = 0;
+    xmlMemSetup(free, counting, realloc, strdup);
+  }
+  ~Requests() { xmlMemSetup(free, malloc, realloc, strdup); }
+  size_t count() const { return requests; }
+
+ private:
+  static void* counting(size_t size) {
+    ++requests;
+    return malloc(size);
+  }
+  static inline size_t requests = 0;
+  static inline xmlFreeFunc free = nullptr;
+  static inline xmlMallocFunc malloc = nullptr;
+  static inline xmlReallocFunc realloc = nullptr;
+  static inline xmlStrdupFunc strdup = nullptr;
+};
+
+// Ends the reading at the first comment, in one way or the other.
+class EndAtComment final : public LibXMLHandler {
+ public:
+  explicit EndAtComment(bool isEvaluationEnded) : _isEvaluationEnded(isEvaluationEnded) {}
+  void startElement(const LibXMLName&, const LibXMLNamespaces&, const LibXMLAttributes&) override {}
+  void endElement() override {}
+  void characters(std::string_view) override {}
+  void CDATA(std::string_view) override {}
+  void comment(std::string_view) override {
+    if (_isEvaluationEnded) throw Ended();
+    throw LibXMLStop{"a comment"};
+  }
+  void processingInstruction(LibXMLText, std::string_view) override {}
+
+ private:
+  const bool _isEvaluationEnded;
+};
+
+size_t requestsUntilComment(const std::string& text, bool isEvaluationEnded) {
+  size_t at = 0;
+  const LibXMLReader read = [&](char* buffer, size_t size) {
+    const size_t count = text.copy(buffer, size, at);
+    at += count;
+    return static_cast<ptrdiff_t>(count);
+  };
+  EndAtComment handler(isEvaluationEnded);
+  NSXMLParseError error;
+  const Requests requests;
+  if (isEvaluationEnded) {
+    EXPECT_THROW(static_cast<void>(parseWithLibXML(read, handler, error)), Ended);
+  } else {
+    EXPECT_FALSE(parseWithLibXML(read, handler, error));
+    EXPECT_EQ(error.message, "a comment");
+  }
+  return requests.count();
+}
+
+TEST(XMLDeclarations, WhatEndsInsideAnEntityEndsAtOnce) {
+  constexpr size_t count = 10'000;
+  std::string comments;
+  for (size_t index = 0; index < count; ++index) comments += "<!--x-->";
+  const auto document = [&](const std::string& entities, const char* content) {
+    return "<!DOCTYPE a [" + entities + "]><a>" + content + comments + "</a>";
+  };
+  const std::string entity = "<!ENTITY e '" + comments + "'>";
+  const std::string around = "<!ENTITY f '<b>&e;</b>" + comments + "'>";
+  for (const bool isEvaluationEnded : {false, true}) {
+    EXPECT_LT(requestsUntilComment(document("", ""), isEvaluationEnded), count / 10);
+    EXPECT_LT(requestsUntilComment(document(entity, "&e;"), isEvaluationEnded), count / 10);
+    EXPECT_LT(requestsUntilComment(document(entity + around, "&f;"), isEvaluationEnded),
+              count / 10);
+  }
 }
 
 TEST(XMLDeclarations, WhatIsReportedStaysInside) {
