@@ -1,15 +1,13 @@
 #include "Platform/Reading/DeclaredNames.h"
 
 #include "Platform/Text/UTF8.h"
+#include "Platform/Tree/ReservedNamespaces.h"
 
 #include <algorithm>
 
 namespace xquery {
 
 namespace {
-
-constexpr std::string_view namespaceOfXML = "http://www.w3.org/XML/1998/namespace";
-constexpr std::string_view namespaceOfDeclarations = "http://www.w3.org/2000/xmlns/";
 
 // What may stand in a name but not begin it.
 bool isNeverFirst(char32_t point) {

@@ -21,6 +21,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/Names.h"
+#include "Platform/Tree/ReservedNamespaces.h"
 #include "Platform/Tree/XMLOutput.h"
 #include "xquery/XMLNode.h"
 
@@ -112,9 +113,6 @@ class NamespaceScope {
 };
 
 // --- what names can be ---------------------------------------------------------------------------
-
-constexpr std::string_view namespaceOfXML = "http://www.w3.org/XML/1998/namespace";
-constexpr std::string_view namespaceOfDeclarations = "http://www.w3.org/2000/xmlns/";
 
 bool isReserved(NSStringView prefix) {
   return prefix == "xml" || prefix == "xmlns";

@@ -1,5 +1,6 @@
 // What libxml2 takes while it reads counts like memory of our own.
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/IgnorantHandler.h"
 #include "Platform/Reading/LibXML.h"
 #include "Platform/Reading/LibXMLMemory.h"
 #include "xquery/XMLNode.h"
@@ -14,6 +15,8 @@
 
 namespace xquery {
 namespace {
+
+using readingtest::IgnorantHandler;
 
 constexpr int64_t MiB = int64_t{1} << 20;
 
@@ -45,16 +48,6 @@ class Ceiling final : public WorkWatcher {
   const int64_t _start;
   int64_t _most = 0;
   const WorkMeter _outer;
-};
-
-class Ignorant final : public LibXMLHandler {
- public:
-  void startElement(const LibXMLName&, const LibXMLNamespaces&, const LibXMLAttributes&) override {}
-  void endElement() override {}
-  void characters(std::string_view) override {}
-  void CDATA(std::string_view) override {}
-  void comment(std::string_view) override {}
-  void processingInstruction(LibXMLText, std::string_view) override {}
 };
 
 // A document that begins and then goes on without end.
@@ -98,7 +91,7 @@ bool isEnded(const Endless& document, int64_t ceiling, size_t mostRead) {
     return static_cast<ptrdiff_t>(count);
   };
   const Ceiling watching(ceiling);
-  Ignorant handler;
+  IgnorantHandler handler;
   NSXMLParseError error;
   try {
     static_cast<void>(parseWithLibXML(read, handler, error));

@@ -1,8 +1,10 @@
 // Documents with every kind of declaration, sound and unsound, and every way in which the reading
 // of them ends.
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/IgnorantHandler.h"
 #include "Platform/Reading/LibXML.h"
 #include "Platform/Reading/LibXMLMemory.h"
+#include "Platform/Tree/ReservedNamespaces.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
@@ -16,6 +18,8 @@
 
 namespace xquery {
 namespace {
+
+using readingtest::IgnorantHandler;
 
 // Each as it stands in an internal subset; all are well-formed.
 const std::vector<std::string> declarations = {
@@ -150,16 +154,6 @@ TEST(XMLDeclarations, TheyMayBeCutAnywhere) {
   }
 }
 
-class Ignorant final : public LibXMLHandler {
- public:
-  void startElement(const LibXMLName&, const LibXMLNamespaces&, const LibXMLAttributes&) override {}
-  void endElement() override {}
-  void characters(std::string_view) override {}
-  void CDATA(std::string_view) override {}
-  void comment(std::string_view) override {}
-  void processingInstruction(LibXMLText, std::string_view) override {}
-};
-
 // A failing reader gives the text up to a place and then fails in its way.
 template <class Fail>
 void readUpTo(const std::string& text, size_t place, Fail fail) {
@@ -171,7 +165,7 @@ void readUpTo(const std::string& text, size_t place, Fail fail) {
     at += count;
     return static_cast<ptrdiff_t>(count);
   };
-  Ignorant handler;
+  IgnorantHandler handler;
   NSXMLParseError error;
   EXPECT_FALSE(parseWithLibXML(read, handler, error));
 }
@@ -232,18 +226,13 @@ class Requests {
 };
 
 // Ends the reading at the first comment, in one way or the other.
-class EndAtComment final : public LibXMLHandler {
+class EndAtComment final : public IgnorantHandler {
  public:
   explicit EndAtComment(bool isEvaluationEnded) : _isEvaluationEnded(isEvaluationEnded) {}
-  void startElement(const LibXMLName&, const LibXMLNamespaces&, const LibXMLAttributes&) override {}
-  void endElement() override {}
-  void characters(std::string_view) override {}
-  void CDATA(std::string_view) override {}
   void comment(std::string_view) override {
     if (_isEvaluationEnded) throw Ended();
     throw LibXMLStop{"a comment"};
   }
-  void processingInstruction(LibXMLText, std::string_view) override {}
 
  private:
   const bool _isEvaluationEnded;
@@ -321,9 +310,6 @@ std::string withDefault(const std::string& name, const std::string& value = "v")
   return "<!DOCTYPE a [<!ATTLIST a " + name + " CDATA '" + value + "'>]><a xmlns:p='u'/>";
 }
 
-constexpr const char* namespaceOfXML = "http://www.w3.org/XML/1998/namespace";
-constexpr const char* namespaceOfDeclarations = "http://www.w3.org/2000/xmlns/";
-
 TEST(XMLDeclarations, ADefaultedAttributeHasAQualifiedName) {
   for (const char* name : {"b", "p:b", "xml:b", "p:_", "\xC3\xA9", "p:\xC3\xA9-1", "b\xC2\xB7"}) {
     EXPECT_EQ(errorOf(withDefault(name)), "") << name;
@@ -351,7 +337,7 @@ TEST(XMLDeclarations, ADefaultedPrefixIsDeclared) {
 TEST(XMLDeclarations, ADefaultedNamespaceDeclarationIsOneThatATagMayHave) {
   struct Declaration {
     const char* name;
-    const char* URI;
+    std::string_view URI;
     bool isAllowed;
   };
   for (const Declaration& each : {
@@ -368,11 +354,11 @@ TEST(XMLDeclarations, ADefaultedNamespaceDeclarationIsOneThatATagMayHave) {
            Declaration{"xmlns:xmlns", "u", false},
            Declaration{"xmlns:xmlns", namespaceOfDeclarations, false},
        }) {
-    const std::string where = std::string(each.name) + "=" + each.URI;
-    EXPECT_EQ(errorOf(withDefault(each.name, each.URI)),
+    const std::string where = std::string(each.name) + "=" + std::string(each.URI);
+    EXPECT_EQ(errorOf(withDefault(each.name, std::string(each.URI))),
               each.isAllowed ? "" : "a defaulted namespace declaration that is not allowed")
         << where;
-    const std::string given = "<a " + std::string(each.name) + "='" + each.URI + "'/>";
+    const std::string given = "<a " + std::string(each.name) + "='" + std::string(each.URI) + "'/>";
     EXPECT_EQ(errorOf(given).empty(), each.isAllowed) << where;
   }
 }
