@@ -127,13 +127,13 @@ std::vector<LimitRow> treeRows() {
       // --- giving back
       // -----------------------------------------------------------------------------
       {"free: list",
-       "let $s := for $i in 1 to 3000000 return concat('a', $i) for $i in 1 to 2000000000 where $i "
+       "let $s := for $i in 1 to 3000000 return concat('a', $i) for $i in 1 to 100000000 where $i "
        "< 0 return $s"},
       {"free: trees",
-       "let $s := for $i in 1 to 600000 return <a/> for $i in 1 to 2000000000 where $i < 0 return "
+       "let $s := for $i in 1 to 600000 return <a/> for $i in 1 to 100000000 where $i < 0 return "
        "$s"},
       {"free: tree",
-       "let $s := <a>{for $i in 1 to 1000000 return <b>x</b>}</a> for $i in 1 to 2000000000 where "
+       "let $s := <a>{for $i in 1 to 1000000 return <b>x</b>}</a> for $i in 1 to 100000000 where "
        "$i < 0 return $s"},
   };
 }
