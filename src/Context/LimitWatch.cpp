@@ -32,6 +32,13 @@ int64_t mostBytes(const XQueryLimits& limits, int64_t inUse) {
 // The innermost on this thread.
 thread_local XQueryLimitWatch* innermost = nullptr;
 
+// What former evaluations have left behind is no part of a later one, so that its going may not
+// show while there is one.
+const WorkMeter& meterAtBeginning() {
+  if (!innermost) settleAbandonedValues();
+  return workMeter;
+}
+
 }  // namespace
 
 XQueryLimitWatch::XQueryLimitWatch(XQueryContext& context)
@@ -45,7 +52,8 @@ XQueryLimitWatch::XQueryLimitWatch(const XQueryLimits& limits, XQueryContext* co
       _limits(limits),
       _deadline(deadlineOf(_limits)),
       _around(innermost),
-      _outer(workMeter),
+      _outer(meterAtBeginning()),
+      _outerAbandoned(abandonedValues),
       _mostBytes(mostBytes(_limits, workMeter.valueBytes)) {
   WorkMeter& meter = workMeter;
   meter.stepsLeft = stepsBetweenLooks();
@@ -63,6 +71,9 @@ XQueryLimitWatch::~XQueryLimitWatch() {
   meter.wasRefused = _outer.wasRefused || outerRefused;
   meter.watcher = _outer.watcher;
   innermost = _around;
+  abandonedValues = _outerAbandoned;
+  if (!_around) return;
+  _around->_reached ? _abandoned.passTo(_around->_abandoned) : _abandoned.freeHere();
 }
 
 int64_t XQueryLimitWatch::stepsBetweenLooks() const {
@@ -95,6 +106,7 @@ void XQueryLimitWatch::lookAtWork() {
   _isRaising = true;
   _error = _reached->error();
   _isRaising = false;
+  abandonedValues = &_abandoned;
   workMeter.stepsLeft = 0;
   if (_context) _context->_internal().raise(_error);
   throw NSException("XQueryError", _error->description());

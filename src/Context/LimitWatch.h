@@ -15,6 +15,7 @@
 // error like any other; passed over or not, the outer one ends at its next look.
 #pragma once
 
+#include "Platform/Base/Abandoned.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/Limits.h"
@@ -52,7 +53,9 @@ class XQueryLimitWatch final : public WorkWatcher {
   const std::optional<std::chrono::steady_clock::time_point> _deadline;
   XQueryLimitWatch* const _around;  // the evaluation that this one is part of, if any
   const WorkMeter _outer;           // what was in force before
-  const int64_t _mostBytes;         // by the limits of this one alone
+  AbandonedValues* const _outerAbandoned;
+  AbandonedValues _abandoned;
+  const int64_t _mostBytes;  // by the limits of this one alone
   const XQueryErrorText<>* _reached = nullptr;
   Ref<XQueryError> _error;
   bool _isRaising = false;

@@ -184,6 +184,8 @@ void decorateWithBaseURI(const NSArray& items, const XQueryContextInternal& cont
 // been reached because of what those hold.
 void dropValues(XQueryContextInternal& context, const Value& formerContextItem,
                 int64_t formerPosition) {
+  context._clearGlobals();
+  context.keptValues().clear();
   context._setInScopeVariables(nullptr);
   context.setContextItem(formerContextItem, formerPosition);
 }

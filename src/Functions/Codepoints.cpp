@@ -53,14 +53,15 @@ Value stringOf(const std::vector<int32_t>& points, bool ascii) {
 
 template <class Units>
 Value integers(const Units& units) {
-  std::vector<Value> items;
+  const auto list = NSArray::array();
+  std::vector<Value>& items = list->objects();
   items.reserve(units.size());
   WorkPacer pacer;
   for (const auto unit : units) {
     pacer.turn();
     items.push_back(XQueryNumber::integerWithInt64(static_cast<int64_t>(unit)));
   }
-  return normalised(NSArray::arrayWithObjects(std::move(items)));
+  return normalised(list);
 }
 
 }  // namespace

@@ -1,6 +1,8 @@
 // Evaluations under limits, and how late they end.
 #pragma once
 
+#include "Platform/Base/Abandoned.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>
@@ -30,6 +32,13 @@ constexpr milliseconds mostWait(500);
 
 // The last error, the focus and the like.
 constexpr int64_t keptByAContext = 65536;
+
+// What this thread has taken, when all that was left behind is free.
+inline int64_t valueBytes() {
+  waitForAbandonedValues();
+  settleAbandonedValues();
+  return workMeter.valueBytes;
+}
 
 struct Outcome {
   std::string result;  // the string values of the items, separated by spaces

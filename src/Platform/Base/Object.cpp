@@ -13,7 +13,10 @@
 // Under a sanitizer every block comes from malloc, so that it sees each of them.
 #include "xquery/Object.h"
 
+#include "Platform/Base/Abandoned.h"
+#include "Platform/Base/ObjectBlocks.h"
 #include "Platform/Base/WorkMeter.h"
+#include "xquery/Collection.h"
 #include "xquery/Memory.h"
 
 #include <algorithm>
@@ -109,22 +112,8 @@ void giveRemainder(size_t size) {
   threadState.chunkLeft -= size;
 }
 
-// Gives everything the thread holds to the process.
-void giveAll() {
-  for (size_t index = 0; index < sizeCount; ++index) {
-    BlockList& blocks = threadState.lists[index];
-    if (blocks.first) giveList(index, blocks.first);
-    if (blocks.reserve) giveList(index, blocks.reserve);
-    blocks = BlockList();
-  }
-  // The rest of the chunk becomes blocks of the largest size that fits.
-  while (threadState.chunkLeft >= granule) {
-    giveRemainder(std::min(threadState.chunkLeft, largestBlock));
-  }
-}
-
 struct ThreadExit {
-  ~ThreadExit() { giveAll(); }
+  ~ThreadExit() { giveFreeBlocks(); }
 };
 
 void closeAtThreadExit() {
@@ -309,6 +298,19 @@ bool pushPending(const NSCounted* object) {
 
 }  // namespace
 
+void giveFreeBlocks() {
+  for (size_t index = 0; index < sizeCount; ++index) {
+    BlockList& blocks = threadState.lists[index];
+    if (blocks.first) giveList(index, blocks.first);
+    if (blocks.reserve) giveList(index, blocks.reserve);
+    blocks = BlockList();
+  }
+  // The rest of the chunk becomes blocks of the largest size that fits.
+  while (threadState.chunkLeft >= granule) {
+    giveRemainder(std::min(threadState.chunkLeft, largestBlock));
+  }
+}
+
 void* NSCounted::operator new(size_t size) {
   countValueBytes(size);
   if (!usesFreeLists || size > largestBlock) return ::operator new(size);
@@ -344,6 +346,11 @@ void NSCounted::destroy(const NSCounted* object) {
   // A nested destruction takes a few hundred bytes of stack, so this depth is safe everywhere.
   constexpr uint32_t maximumDepth = 64;
   ThreadState& state = threadState;
+  if (abandonedValues) [[unlikely]] {
+    const auto free = [](const void* each) { destroy(static_cast<const NSCounted*>(each)); };
+    const auto* list = dyn_cast<NSArray>(object);
+    if (list && abandonedValues->take(object, free, list->count())) return;
+  }
   if (state.destructionDepth >= maximumDepth && pushPending(object)) return;
   ++state.destructionDepth;
   delete object;
@@ -357,7 +364,8 @@ void NSCounted::destroy(const NSCounted* object) {
 }
 
 void XQueryReleaseIdleMemory() {
-  giveAll();
+  waitForAbandonedValues();
+  giveFreeBlocks();
   try {
     IdleBlocks().giveBack();
   } catch (const std::bad_alloc&) {

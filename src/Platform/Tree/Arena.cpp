@@ -1,5 +1,6 @@
 #include "Platform/Tree/Arena.h"
 
+#include "Platform/Base/Abandoned.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/UTF16.h"
 #include "Platform/Tree/Names.h"
@@ -112,6 +113,12 @@ NSXMLTree* NSXMLTree::create() {
 }
 
 void NSXMLTree::destroy() {
+  if (abandonedValues) [[unlikely]] {
+    const auto free = [](const void* tree) {
+      static_cast<NSXMLTree*>(const_cast<void*>(tree))->destroy();
+    };
+    if (abandonedValues->take(this, free, blockCount())) return;
+  }
   if (NSXMLTreeExtra* present = extra()) {
     for (NSXMLDocument* document : present->documents) document->_URI->release();
   }
@@ -423,6 +430,9 @@ NSXMLNode* NSXMLTree::makeLoneAttribute(const NSXMLName* name, NSStringView text
 
 void NSXMLTree::merge(NSXMLTree* a, NSXMLTree* b) {
   if (a == b) return;
+  // A thread that still frees lists of an evaluation knows nodes of no tree made in this one.
+  const uint64_t era = NSXMLEra::current();
+  if (era == 0 || a->_era < era || b->_era < era) waitForAbandonedValues();
   if (a->blockCount() < b->blockCount()) std::swap(a, b);
   a->absorb(b);
 }

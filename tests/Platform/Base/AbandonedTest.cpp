@@ -1,0 +1,108 @@
+#include "Platform/Base/Abandoned.h"
+#include "Platform/Base/WorkMeter.h"
+#include "xquery/Collection.h"
+#include "xquery/XMLNode.h"
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <thread>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+std::atomic<size_t> freedHere = 0;
+std::atomic<size_t> freedElsewhere = 0;
+const std::thread::id testThread = std::this_thread::get_id();
+
+// Tells which thread has freed it.
+class Witness : public NSCounted {
+ public:
+  Witness() : NSCounted(Kind::String) {}
+  ~Witness() override { ++(std::this_thread::get_id() == testThread ? freedHere : freedElsewhere); }
+};
+
+Ref<NSArray> witnesses(size_t count) {
+  std::vector<Value> objects;
+  for (size_t index = 0; index < count; ++index) objects.push_back(make<Witness>());
+  return NSArray::arrayWithObjects(std::move(objects));
+}
+
+// As an evaluation that is ended leaves them.
+template <class... Lists>
+void abandon(Lists... lists) {
+  AbandonedValues abandoned;
+  abandonedValues = &abandoned;
+  (static_cast<void>(lists = nullptr), ...);
+  abandonedValues = nullptr;
+  EXPECT_EQ(freedElsewhere, 0U);
+}
+
+class Abandoned : public testing::Test {
+ protected:
+  void SetUp() override {
+    waitForAbandonedValues();
+    settleAbandonedValues();
+    freedHere = freedElsewhere = 0;
+  }
+};
+
+TEST_F(Abandoned, LongListsAreFreedByAnotherThreadAndCountedUntilThen) {
+  const int64_t before = workMeter.valueBytes;
+  const size_t half = AbandonedValues::manyPartsInAll / 2;
+  abandon(witnesses(half), witnesses(half));
+  EXPECT_EQ(freedHere, 0U);
+  EXPECT_GT(workMeter.valueBytes, before + static_cast<int64_t>(2 * half * sizeof(Witness)) - 1);
+  waitForAbandonedValues();
+  EXPECT_EQ(freedElsewhere, 2 * half);
+  settleAbandonedValues();
+  EXPECT_EQ(workMeter.valueBytes, before);
+}
+
+TEST_F(Abandoned, FewValuesAreFreedAtOnce) {
+  const int64_t before = workMeter.valueBytes;
+  abandon(witnesses(AbandonedValues::manyPartsInAll - 1), witnesses(10));
+  EXPECT_EQ(freedHere, AbandonedValues::manyPartsInAll + 9);
+  EXPECT_EQ(workMeter.valueBytes, before);
+}
+
+TEST_F(Abandoned, WhatIsStillHeldStays) {
+  const Ref<NSArray> kept = witnesses(AbandonedValues::manyPartsInAll);
+  abandon(Ref<NSArray>(kept), NSArray::arrayWithObjects(kept->objects()));
+  waitForAbandonedValues();
+  EXPECT_EQ(freedHere + freedElsewhere, 0U);
+}
+
+TEST_F(Abandoned, ATreeOfManyBlocksGoesWhole) {
+  const int64_t before = workMeter.valueBytes;
+  auto root = NSXMLElement::elementWithName(NSStringView::ascii("r"));
+  for (size_t index = 0; index < AbandonedValues::manyPartsInAll; ++index) {
+    root->addChild(NSXMLElement::elementWithName(NSStringView::ascii("e")));
+  }
+  const int64_t with = workMeter.valueBytes;
+  AbandonedValues values;
+  abandonedValues = &values;
+  root = nullptr;
+  abandonedValues = nullptr;
+  EXPECT_EQ(workMeter.valueBytes, with);
+  AbandonedValues outer;
+  values.passTo(outer);
+  outer.freeHere();
+  EXPECT_EQ(workMeter.valueBytes, before);
+}
+
+// The lists hold nodes of a tree that the host goes on changing.
+TEST_F(Abandoned, ATreeIsNotMergedWhileListsOfItsNodesAreFreed) {
+  for (int round = 0; round < 5; ++round) {
+    const auto root = NSXMLElement::elementWithName(NSStringView::ascii("r"));
+    const auto child = NSXMLElement::elementWithName(NSStringView::ascii("e"));
+    std::vector<Value> nodes(2 * AbandonedValues::manyPartsInAll, Value(child.get()));
+    abandon(NSArray::arrayWithObjects(std::move(nodes)));
+    root->addChild(child);
+    EXPECT_EQ(root->XMLString()->utf8(), "<r><e/></r>");
+  }
+}
+
+}  // namespace
+}  // namespace xquery
