@@ -54,6 +54,7 @@ XQueryLimitWatch::XQueryLimitWatch(const XQueryLimits& limits, XQueryContext* co
       _around(innermost),
       _outer(meterAtBeginning()),
       _outerAbandoned(abandonedValues),
+      _abandoned(isOver, this),
       _mostBytes(mostBytes(_limits, workMeter.valueBytes)) {
   WorkMeter& meter = workMeter;
   meter.stepsLeft = stepsBetweenLooks();
@@ -61,6 +62,7 @@ XQueryLimitWatch::XQueryLimitWatch(const XQueryLimits& limits, XQueryContext* co
   meter.wasRefused = false;
   meter.watcher = this;
   innermost = this;
+  if (isLimited()) abandonedValues = &_abandoned;
 }
 
 XQueryLimitWatch::~XQueryLimitWatch() {
@@ -76,9 +78,23 @@ XQueryLimitWatch::~XQueryLimitWatch() {
   _around->_reached ? _abandoned.passTo(_around->_abandoned) : _abandoned.freeHere();
 }
 
+bool XQueryLimitWatch::isLimited() const {
+  return _deadline || _limits.cancelled || _limits.memoryCeiling;
+}
+
+// The ceiling plays no part: what is being freed still counts.
+bool XQueryLimitWatch::isTimeUp() const {
+  if (_limits.cancelled && _limits.cancelled->load(std::memory_order_relaxed)) return true;
+  if (_deadline && Clock::now() >= *_deadline) return true;
+  return _around && _around->isTimeUp();
+}
+
+bool XQueryLimitWatch::isOver(void* watch) noexcept {
+  return static_cast<const XQueryLimitWatch*>(watch)->isTimeUp();
+}
+
 int64_t XQueryLimitWatch::stepsBetweenLooks() const {
-  const bool isLimited = _deadline || _limits.cancelled || _limits.memoryCeiling;
-  if (isLimited) return stepsPerLook;
+  if (isLimited()) return stepsPerLook;
   return _around ? _around->stepsBetweenLooks() : WorkMeter::manySteps;
 }
 
@@ -107,6 +123,7 @@ void XQueryLimitWatch::lookAtWork() {
   _error = _reached->error();
   _isRaising = false;
   abandonedValues = &_abandoned;
+  _abandoned.setOver();
   workMeter.stepsLeft = 0;
   if (_context) _context->_internal().raise(_error);
   throw NSException("XQueryError", _error->description());

@@ -44,6 +44,9 @@ class XQueryLimitWatch final : public WorkWatcher {
  private:
   const XQueryErrorText<>* ownLimit() const;
   const XQueryErrorText<>* reachedLimit();
+  bool isLimited() const;
+  bool isTimeUp() const;
+  static bool isOver(void* watch) noexcept;
   int64_t stepsBetweenLooks() const;
 
   XQueryLimitWatch(const XQueryLimits& limits, XQueryContext* context);

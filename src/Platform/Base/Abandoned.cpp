@@ -75,8 +75,13 @@ bool AbandonedValues::add(const Entry& entry) noexcept {
   }
 }
 
+bool AbandonedValues::isOver() noexcept {
+  if (_isReached && _isReached(_evaluation)) _isReached = nullptr;
+  return !_isReached;
+}
+
 bool AbandonedValues::take(const void* object, Free free, size_t parts) noexcept {
-  if (parts < manyParts || !add({object, free})) return false;
+  if (_isReached || parts < manyParts || !add({object, free})) return false;
   _parts += parts;
   return true;
 }

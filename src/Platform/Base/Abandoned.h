@@ -6,10 +6,8 @@
 // evaluation is over, a thread of its own frees them. What does not add up to a few milliseconds is
 // freed at once, so that most processes never have such a thread.
 //
-//   AbandonedValues abandoned;        // of the evaluation
-//   abandonedValues = &abandoned;     // the limit is reached
-//   ...                               // on its way out
-//   abandonedValues = nullptr;
+// What goes before is freed at once, but a very large list or tree may take longer than a limit
+// gives. It is freed in parts, and set aside when a limit turns out to be reached between them.
 //
 // The memory counts for the thread that made the values until it is free.
 #pragma once
@@ -22,15 +20,24 @@ namespace xquery {
 class AbandonedValues {
  public:
   using Free = void (*)(const void* object);
+  using Ask = bool (*)(void* evaluation) noexcept;
 
   // Fewer parts are not worth an entry; fewer in all, not a thread.
   static constexpr size_t manyParts = 1024;
   static constexpr size_t manyPartsInAll = 20'000;
+  // That are freed before anybody asks: a few milliseconds.
+  static constexpr size_t partsPerLook = 16'384;
 
-  AbandonedValues() = default;
+  // Of an evaluation that is asked whether a limit is reached; null for one that is over.
+  explicit AbandonedValues(Ask isReached = nullptr, void* evaluation = nullptr)
+      : _isReached(isReached), _evaluation(evaluation) {}
   ~AbandonedValues();
   AbandonedValues(const AbandonedValues&) = delete;
   AbandonedValues& operator=(const AbandonedValues&) = delete;
+
+  // Whether a limit is reached. Until then nothing is taken; once it is, it stays so.
+  bool isOver() noexcept;
+  void setOver() { _isReached = nullptr; }
 
   // To be freed later by that function, on any thread; false when it is to be freed now. The parts
   // are the objects and blocks that go with it.
@@ -53,11 +60,13 @@ class AbandonedValues {
   static void* work(void* job);
   bool handOver();
 
+  Ask _isReached;
+  void* const _evaluation;
   std::vector<Entry> _entries;
   size_t _parts = 0;
 };
 
-// Where this thread sets aside what goes; null as long as it frees everything itself.
+// Where this thread sets aside what goes; null without limits.
 extern constinit thread_local AbandonedValues* abandonedValues
     __attribute__((tls_model("initial-exec")));
 

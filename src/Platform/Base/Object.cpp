@@ -296,6 +296,20 @@ bool pushPending(const NSCounted* object) {
   return true;
 }
 
+// Whether the list, or what is left of it, is freed later.
+bool isSetAside(const NSCounted* object, AbandonedValues::Free free) {
+  if (!NSArray::classof(*object)) return false;
+  // Nobody else knows it any more.
+  auto& objects = const_cast<NSArray*>(static_cast<const NSArray*>(object))->objects();
+  AbandonedValues& abandoned = *abandonedValues;
+  while (!abandoned.take(object, free, objects.size())) {
+    if (objects.size() <= AbandonedValues::partsPerLook) return false;
+    objects.resize(objects.size() - AbandonedValues::partsPerLook);
+    abandoned.isOver();
+  }
+  return true;
+}
+
 }  // namespace
 
 void giveFreeBlocks() {
@@ -346,10 +360,9 @@ void NSCounted::destroy(const NSCounted* object) {
   // A nested destruction takes a few hundred bytes of stack, so this depth is safe everywhere.
   constexpr uint32_t maximumDepth = 64;
   ThreadState& state = threadState;
-  if (abandonedValues) [[unlikely]] {
-    const auto free = [](const void* each) { destroy(static_cast<const NSCounted*>(each)); };
-    const auto* list = dyn_cast<NSArray>(object);
-    if (list && abandonedValues->take(object, free, list->count())) return;
+  if (abandonedValues) {
+    const auto free = [](const void* list) { destroy(static_cast<const NSCounted*>(list)); };
+    if (isSetAside(object, free)) return;
   }
   if (state.destructionDepth >= maximumDepth && pushPending(object)) return;
   ++state.destructionDepth;

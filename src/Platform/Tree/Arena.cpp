@@ -129,12 +129,12 @@ void NSXMLTree::destroy() {
   NSCounted::operator delete(this, sizeof(NSXMLTree));
 }
 
-void NSXMLTree::freeBlocks() {
-  if (!_lastBlock) return;
-  NSXMLBlock* block = nextBlock(_lastBlock);
-  setNextBlock(_lastBlock, nullptr);
-  while (block) {
-    NSXMLBlock* next = nextBlock(block);
+namespace {
+
+// Of a row of blocks, from this one on.
+void freeRow(NSXMLBlock* block) {
+  for (size_t count = 1; block; ++count) {
+    NSXMLBlock* const next = nextBlock(block);
     if (const size_t sizeClass = block->next & sizeClassBits) {
       NSCounted::operator delete(block, sizeClass* blockGranule);
     } else {
@@ -142,7 +142,22 @@ void NSXMLTree::freeBlocks() {
       std::free(block);
     }
     block = next;
+    if (count % AbandonedValues::partsPerLook != 0 || !block || !abandonedValues) continue;
+    const auto free = [](const void* rest) {
+      freeRow(static_cast<NSXMLBlock*>(const_cast<void*>(rest)));
+    };
+    // How many are left is not known; so many have shown that there are many.
+    if (abandonedValues->isOver() && abandonedValues->take(block, free, count)) return;
   }
+}
+
+}  // namespace
+
+void NSXMLTree::freeBlocks() {
+  if (!_lastBlock) return;
+  NSXMLBlock* const first = nextBlock(_lastBlock);
+  setNextBlock(_lastBlock, nullptr);
+  freeRow(first);
 }
 
 // A count that has ever reached the top bit stays there: such a tree is never freed.

@@ -92,6 +92,47 @@ TEST_F(Abandoned, ATreeOfManyBlocksGoesWhole) {
   EXPECT_EQ(workMeter.valueBytes, before);
 }
 
+// The evaluation is over when this was asked so many times.
+bool isOverNow(void* turnsLeft) noexcept {
+  return --*static_cast<int*>(turnsLeft) <= 0;
+}
+
+TEST_F(Abandoned, UntilALimitIsReachedVeryLongListsAreFreedInParts) {
+  int turnsLeft = 3;
+  {
+    AbandonedValues abandoned(isOverNow, &turnsLeft);
+    abandonedValues = &abandoned;
+    witnesses(AbandonedValues::manyPartsInAll) = nullptr;
+    EXPECT_EQ(freedHere, AbandonedValues::manyPartsInAll);
+    EXPECT_EQ(turnsLeft, 2);
+    witnesses(10 * AbandonedValues::partsPerLook) = nullptr;
+    EXPECT_EQ(freedHere, AbandonedValues::manyPartsInAll + 2 * AbandonedValues::partsPerLook);
+    EXPECT_EQ(turnsLeft, 0);
+    abandonedValues = nullptr;
+  }
+  waitForAbandonedValues();
+  EXPECT_EQ(freedElsewhere, 8 * AbandonedValues::partsPerLook);
+}
+
+TEST_F(Abandoned, UntilALimitIsReachedTreesOfVeryManyBlocksAreFreedInParts) {
+  const int64_t before = workMeter.valueBytes;
+  auto root = NSXMLElement::elementWithName(NSStringView::ascii("r"));
+  for (size_t index = 0; index < 3 * AbandonedValues::partsPerLook; ++index) {
+    root->addChild(NSXMLElement::elementWithName(NSStringView::ascii("e")));
+  }
+  const int64_t with = workMeter.valueBytes;
+  int turnsLeft = 2;
+  AbandonedValues abandoned(isOverNow, &turnsLeft);
+  abandonedValues = &abandoned;
+  root = nullptr;
+  abandonedValues = nullptr;
+  EXPECT_EQ(turnsLeft, 0);
+  EXPECT_NEAR(static_cast<double>(workMeter.valueBytes - before),
+              static_cast<double>(with - before) / 3, static_cast<double>(with - before) / 10);
+  abandoned.freeHere();
+  EXPECT_EQ(workMeter.valueBytes, before);
+}
+
 // The lists hold nodes of a tree that the host goes on changing.
 TEST_F(Abandoned, ATreeIsNotMergedWhileListsOfItsNodesAreFreed) {
   for (int round = 0; round < 5; ++round) {
