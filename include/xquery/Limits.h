@@ -12,8 +12,10 @@
 //   context->contextSetLimits(limits);
 //   ... on another thread: limits.cancelled->store(true);
 //
-// Time and flag are looked at often enough that an evaluation stops within a tenth of a second;
-// giving back the memory of very large results comes on top, tens of nanoseconds per value.
+// Time and flag are looked at often enough that an evaluation stops within a tenth of a second, the
+// freeing of what it made included: where that is much, a thread of the library frees it afterwards
+// and ends by itself. A fork of the process, and a change of which tree a node belongs to outside
+// of any evaluation, wait for such a thread.
 #pragma once
 
 #include <atomic>

@@ -13,10 +13,11 @@
 
 namespace xquery {
 
-// Gives the system back what nobody uses: of the calling thread, of threads that have ended, and of
-// what other threads handed on. Other threads may evaluate meanwhile; what they keep for themselves
-// at the time, some tens of kilobytes each, stays. Takes about a second for each gigabyte that is
-// idle. Nothing that is in use is touched; may be called at any time on any thread.
+// Gives the system back what nobody uses: of the calling thread, of threads that have ended, of
+// what other threads handed on, and of what evaluations that were ended left behind. Other threads
+// may evaluate meanwhile; what they keep for themselves at the time, some tens of kilobytes each,
+// stays. Takes about a second for each gigabyte that is idle. Nothing that is in use is touched;
+// may be called at any time on any thread.
 XQUERY_EXPORT void XQueryReleaseIdleMemory();
 
 }  // namespace xquery
