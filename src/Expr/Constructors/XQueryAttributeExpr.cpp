@@ -40,6 +40,7 @@ Ref<XQueryAttributeExpr> XQueryAttributeExpr::attributeExprWithName(
 }
 
 void XQueryAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
+  if (!XQueryCheckStack(prolog)) return;
   _name.bind(prolog, Kind::Attribute, exprLine());
   for (const auto& item : _items) item->bindInfoForProlog(prolog);
 }

@@ -1,5 +1,6 @@
 #include "Expr/Constructors/ConstructorTesting.h"
 #include "Expr/Constructors/XQueryAttributeExpr.h"
+#include "Platform/Base/WorkMeter.h"
 
 namespace xquery {
 namespace {
@@ -18,6 +19,14 @@ class AttributeExpr : public Constructors {
 TEST_F(AttributeExpr, KeepsItsDelimiter) {
   EXPECT_EQ(direct("a")->quoteChar(), u'\'');
   EXPECT_EQ(XQueryAttributeExpr::attributeExprWithName(text("a"), {}, u'"')->quoteChar(), u'"');
+}
+
+// A tag may have hundreds of thousands.
+TEST_F(AttributeExpr, BindingOneIsAStepOfWork) {
+  const auto attribute = direct("a");
+  const int64_t before = workMeter.stepsLeft;
+  attribute->bindInfoForProlog(*prolog);
+  EXPECT_LT(workMeter.stepsLeft, before);
 }
 
 TEST_F(AttributeExpr, IsAParentlessNode) {
