@@ -7,6 +7,7 @@ namespace xquery::readingtest {
 
 class IgnorantHandler : public LibXMLHandler {
  public:
+  virtual ~IgnorantHandler() = default;
   void startElement(const LibXMLName&, const LibXMLNamespaces&, const LibXMLAttributes&) override {}
   void endElement() override {}
   void characters(std::string_view) override {}
