@@ -45,6 +45,7 @@ class XQUERY_EXPORT NSArray : public NSCounted {
   explicit NSArray(std::vector<Value> objects)
       : NSCounted(Kind::Array), _objects(std::move(objects)) {}
   explicit NSArray(Kind kind) : NSCounted(kind) {}
+  ~NSArray() override;
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 

@@ -182,6 +182,8 @@ class XQUERY_EXPORT NSCounted : public NSObject {
 class NSXMLNode;
 XQUERY_EXPORT void retainTreeOf(const NSXMLNode* node);
 XQUERY_EXPORT void releaseTreeOf(const NSXMLNode* node);
+// For each of the nodes; those of one tree in a row are counted together.
+XQUERY_EXPORT void releaseTreesOf(const NSXMLNode* const* nodes, size_t count);
 
 // Kind tests: isa<T>(object), cast<T>(object) (the caller knows), dyn_cast<T>(object) (null when it
 // is another class). All accept null; isa answers false for it.

@@ -69,8 +69,9 @@ Ref<NSString> XQueryContextInternal::defaultCollation() const {
   return _prolog ? _prolog->defaultCollation() : Ref<NSString>();
 }
 
-Ref<NSString> XQueryContextInternal::baseURI() const {
-  return _prolog ? _prolog->baseURI() : Ref<NSString>();
+const Ref<NSString>& XQueryContextInternal::baseURI() const {
+  static const Ref<NSString> none;
+  return _prolog ? _prolog->baseURI() : none;
 }
 
 bool XQueryContextInternal::xmlSpacePreserve() const {

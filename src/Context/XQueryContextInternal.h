@@ -38,6 +38,10 @@ class XQueryContextInternal {
   NSObject* variableForID(int64_t varID) const {
     return _variables ? _variables->valueForID(varID) : nullptr;
   }
+  // The same, as it is held until a variable is set or the frame goes.
+  const Value* variableSlotForID(int64_t varID) const {
+    return _variables ? _variables->slotForID(varID) : nullptr;
+  }
   // ID 0 is ignored.
   void setVariable(Value value, int64_t forID) {
     if (!_variables) _variables = make<XQueryFrame>();
@@ -59,7 +63,7 @@ class XQueryContextInternal {
   Ref<NSString> namespaceForPrefix(NSStringView prefix, bool& fromProlog) const;
   Ref<NSString> defaultElementNamespace() const;
   Ref<NSString> defaultCollation() const;
-  Ref<NSString> baseURI() const;
+  const Ref<NSString>& baseURI() const;
   bool xmlSpacePreserve() const;
 
   // --- focus -----------------------------------------------------------------------------------

@@ -23,9 +23,14 @@ class XQueryFrame : public NSCounted {
 
   // Null for an ID below 1 or past the end.
   NSObject* valueForID(int64_t varID) const {
+    const Value* slot = slotForID(varID);
+    return slot ? slot->get() : nullptr;
+  }
+  // The same, as it is held until a variable is set.
+  const Value* slotForID(int64_t varID) const {
     const size_t index = indexOf(varID);
     if (index >= _count) return nullptr;
-    return index < nearSlots ? _near[index].get() : _far[index - nearSlots].get();
+    return index < nearSlots ? &_near[index] : &_far[index - nearSlots];
   }
 
   // The ID is at least 1; slots below it that were never set get NSNull.

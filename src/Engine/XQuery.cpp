@@ -9,11 +9,13 @@
 #include "Platform/Base/HostFailure.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Credit.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryValues.h"
 #include "xquery/XMLNode.h"
 
+#include <algorithm>
 #include <functional>
 #include <new>
 #include <stdexcept>
@@ -214,11 +216,33 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   return shapedResult(result, error);
 }
 
+namespace {
+
+// The trees that come in from the host may be in use by other threads.
+void takeCredit(const Value& contextItem, const XQueryConstants& constants) {
+  constexpr size_t mostItems = 16;  // of a list; there is no room for many trees
+  const auto take = [](const NSObject* item) {
+    if (const auto* node = dyn_cast<NSXMLNode>(item)) NSXMLCredit::take(node);
+  };
+  take(contextItem.get());
+  for (const auto& [name, value] : constants) {
+    const auto* items = dyn_cast<NSArray>(value.get());
+    if (!items) take(value.get());
+    for (size_t i = 0; items && i < std::min(items->count(), mostItems); ++i) {
+      take(items->objectAtIndex(i));
+    }
+  }
+}
+
+}  // namespace
+
 // The value of the body, or the error that ended the evaluation.
 Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
                                     const XQueryConstants& constants) {
   XQueryLimitWatch watch(*this);
   const Value contextItem = _private->contextItem();
+  const NSXMLCredit credit;
+  takeCredit(contextItem, constants);
   const int64_t position = _private->position();
   try {
     // A limit that is reached already ends the shortest evaluation as well.

@@ -110,7 +110,9 @@ Ref<NSString> XQueryWildCardNameTest::uriForContext(XQueryContext* context) cons
 
 bool XQueryWildCardNameTest::isValidNode(const NSXMLNode& node, XQueryContext* context) const {
   if (!node.hasName()) return false;
-  if (_prefix) {
+  if (_uri) {  // by itself, since taking a reference for every node would count it
+    if (!haveSameURI(node, _uri)) return false;
+  } else if (_prefix) {
     const Ref<NSString> URI = uriForContext(context);
     if (!URI || !haveSameURI(node, URI)) return false;
   }

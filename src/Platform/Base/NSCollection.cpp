@@ -1,6 +1,8 @@
 #include "xquery/Collection.h"
 
+#include <array>
 #include <new>
+#include <utility>
 
 namespace xquery {
 
@@ -13,6 +15,19 @@ NSNull* NSNull::null() {
     return object;
   }();
   return shared;
+}
+
+// Nodes in a row are mostly those of one tree, whose counter other threads may be using: it is
+// touched once for many of them.
+NSArray::~NSArray() {
+  std::array<const NSXMLNode*, 32> nodes;  // few, since destructions nest
+  size_t count = 0;
+  for (Value& object : _objects) {
+    if (!object || !object->isNode()) continue;
+    nodes[count++] = reinterpret_cast<const NSXMLNode*>(object.detach());
+    if (count == nodes.size()) releaseTreesOf(nodes.data(), std::exchange(count, 0));
+  }
+  releaseTreesOf(nodes.data(), count);
 }
 
 }  // namespace xquery

@@ -3,6 +3,7 @@
 #include "Platform/Base/Abandoned.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/UTF16.h"
+#include "Platform/Tree/Credit.h"
 #include "Platform/Tree/Names.h"
 #include "Platform/Tree/TreeExtra.h"
 
@@ -13,6 +14,7 @@
 #include <malloc.h>
 #include <mutex>
 #include <new>
+#include <optional>
 #include <utility>
 
 namespace xquery {
@@ -165,23 +167,33 @@ namespace {
 constexpr uint32_t immortalBit = 0x80000000U;
 }
 
+bool NSXMLTree::addReferences(uint32_t count) {
+  const uint32_t known = __atomic_load_n(&references, __ATOMIC_RELAXED);
+  if (known & immortalBit) return false;
+  __atomic_fetch_add(&references, count, __ATOMIC_RELAXED);
+  return true;
+}
+
+void NSXMLTree::removeReferences(uint32_t count) {
+  const uint32_t known = __atomic_load_n(&references, __ATOMIC_RELAXED);
+  if (known & immortalBit) return;
+  if (__atomic_fetch_sub(&references, count, __ATOMIC_ACQ_REL) == count) destroy();
+}
+
+// While the process has one thread, there is no better place to count than the tree itself.
 void NSXMLTree::retain() {
-  const uint32_t count = __atomic_load_n(&references, __ATOMIC_RELAXED);
-  if (count & immortalBit) return;
   if (__libc_single_threaded) {
-    references = count + 1;
-  } else {
-    __atomic_fetch_add(&references, 1U, __ATOMIC_RELAXED);
+    if (!(references & immortalBit)) ++references;
+  } else if (!NSXMLCredit::retain(this)) {
+    addReferences(1);
   }
 }
 
-void NSXMLTree::release() {
-  const uint32_t count = __atomic_load_n(&references, __ATOMIC_RELAXED);
-  if (count & immortalBit) return;
+void NSXMLTree::release(uint32_t times) {
   if (__libc_single_threaded) {
-    if ((references = count - 1) == 0) destroy();
-  } else if (__atomic_fetch_sub(&references, 1U, __ATOMIC_ACQ_REL) == 1) {
-    destroy();
+    if (!(references & immortalBit) && (references -= times) == 0) destroy();
+  } else if (!NSXMLCredit::release(this, times)) {
+    removeReferences(times);
   }
 }
 
@@ -190,6 +202,16 @@ void retainTreeOf(const NSXMLNode* node) {
 }
 void releaseTreeOf(const NSXMLNode* node) {
   NSXMLTree::of(node)->release();
+}
+void releaseTreesOf(const NSXMLNode* const* nodes, size_t count) {
+  std::optional<NSXMLCredit> credit;  // for the names of the trees that go
+  if (count > 1 && !__libc_single_threaded && !NSXMLCredit::isUnderWay()) credit.emplace();
+  for (size_t i = 0; i < count;) {
+    NSXMLTree* tree = NSXMLTree::of(nodes[i]);
+    uint32_t times = 0;
+    for (; i < count && NSXMLTree::of(nodes[i]) == tree; ++i) ++times;
+    tree->release(times);
+  }
 }
 
 // --- blocks ----------------------------------------------------------------------------------
@@ -449,6 +471,7 @@ void NSXMLTree::merge(NSXMLTree* a, NSXMLTree* b) {
   const uint64_t era = NSXMLEra::current();
   if (era == 0 || a->_era < era || b->_era < era) waitForAbandonedValues();
   if (a->blockCount() < b->blockCount()) std::swap(a, b);
+  NSXMLCredit::giveBack(b);
   a->absorb(b);
 }
 

@@ -97,7 +97,10 @@ class NSXMLTree : public NSXMLTreeHead {
   void becomeOld() { _era = 0; }
 
   void retain();
-  void release();
+  void release(uint32_t times = 1);
+  // Several at once. False, and nothing done, for a tree that is never freed.
+  bool addReferences(uint32_t count);
+  void removeReferences(uint32_t count);
 
   // --- nodes: without parent, order number 0 ---------------------------------------------------
   // From now on nodes and texts come from large blocks, the first with room for that many bytes.

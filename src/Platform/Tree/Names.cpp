@@ -6,6 +6,8 @@
 // it. Hashes start from a random seed: whoever writes a document cannot choose names that collide.
 #include "Platform/Tree/Names.h"
 
+#include "Platform/Tree/Credit.h"
+
 #include <algorithm>
 #include <array>
 #include <cstdlib>
@@ -143,20 +145,22 @@ class InternTable {
     return entry;
   }
 
-  static void retain(Entry* entry) { __atomic_fetch_add(&entry->references, 1U, __ATOMIC_RELAXED); }
+  static void retain(Entry* entry, uint32_t times = 1) {
+    __atomic_fetch_add(&entry->references, times, __ATOMIC_RELAXED);
+  }
 
   // Whether the last count was given up; the entry has then left the table and the caller frees it.
-  bool release(Entry* entry) {
+  bool release(Entry* entry, uint32_t times = 1) {
     uint32_t count = __atomic_load_n(&entry->references, __ATOMIC_RELAXED);
-    while (count > 1) {
-      if (__atomic_compare_exchange_n(&entry->references, &count, count - 1, true, __ATOMIC_RELEASE,
-                                      __ATOMIC_RELAXED)) {
+    while (count > times) {
+      if (__atomic_compare_exchange_n(&entry->references, &count, count - times, true,
+                                      __ATOMIC_RELEASE, __ATOMIC_RELAXED)) {
         return false;
       }
     }
     Shard& shard = shardOf(entry->hash);
     const std::lock_guard<std::mutex> guard(shard.mutex);
-    if (__atomic_sub_fetch(&entry->references, 1U, __ATOMIC_ACQ_REL) != 0) return false;
+    if (__atomic_sub_fetch(&entry->references, times, __ATOMIC_ACQ_REL) != 0) return false;
     shard.entries.erase(shard.entries.find(entry));
     return true;
   }
@@ -258,8 +262,12 @@ const NSXMLName* NSXMLInternName(NSStringView qualifiedName, NSStringView URI) {
       });
 }
 
+void NSXMLAddReferences(const NSXMLName* name, uint32_t count) {
+  InternTable<NSXMLName, NameKey>::retain(counted(name), count);
+}
+
 void NSXMLRetainName(const NSXMLName* name) {
-  InternTable<NSXMLName, NameKey>::retain(counted(name));
+  if (!NSXMLCredit::retain(name)) NSXMLAddReferences(name, 1);
 }
 
 void NSXMLRetainName(const NSXMLExpandedName* name) {
@@ -273,7 +281,11 @@ void NSXMLReleaseName(const NSXMLExpandedName* name) {
 }
 
 void NSXMLReleaseName(const NSXMLName* name) {
-  if (!tables().names.release(counted(name))) return;
+  if (!NSXMLCredit::release(name)) NSXMLRemoveReferences(name, 1);
+}
+
+void NSXMLRemoveReferences(const NSXMLName* name, uint32_t count) {
+  if (!tables().names.release(counted(name), count)) return;
   NSXMLReleaseName(name->expanded);
   std::free(counted(name));
 }

@@ -39,6 +39,10 @@ void NSXMLRetainName(const NSXMLExpandedName* name);
 void NSXMLReleaseName(const NSXMLName* name);
 void NSXMLReleaseName(const NSXMLExpandedName* name);
 
+// Many at once, for who takes them in advance.
+void NSXMLAddReferences(const NSXMLName* name, uint32_t count);
+void NSXMLRemoveReferences(const NSXMLName* name, uint32_t count);
+
 // A count of a qualified name, or null.
 class NSXMLNameRef {
  public:
