@@ -43,7 +43,7 @@ Ref<XQueryLiteral> XQueryLiteral::doubleLiteralWithString(const Ref<NSString>& t
 Ref<NSString> XQueryLiteral::description() const {
   NSMutableString text;
   text.appendASCII("<XQueryLiteral - ");
-  text.append(XQueryDescription(_value.get())->view());
+  text.append(XQueryDescription(literalValue().get())->view());
   text.appendASCII(">");
   return text.string();
 }

@@ -2,6 +2,7 @@
 // references that wait for run time.
 #pragma once
 
+#include "Expr/LiteralCopies.h"
 #include "Expr/XQueryExpr.h"
 #include "Types/XQueryQName.h"
 #include "xquery/String.h"
@@ -20,10 +21,10 @@ class XQueryLiteral : public XQueryExpr {
   // What overflows becomes an infinity.
   [[nodiscard]] static Ref<XQueryLiteral> doubleLiteralWithString(const Ref<NSString>& text);
 
-  const Value& literalValue() const { return _value; }
+  const Value& literalValue() const { return _value.stored(); }
   void bindInfoForProlog(XQueryProlog&) override {}
-  // The stored object itself, every time.
-  Value computeValue(XQueryContext&) const override { return _value; }
+  // The stored object itself, every time, or the calling thread's own copy.
+  Value computeValue(XQueryContext&) const override { return _value.own(); }
   Ref<NSString> description() const override;
 
  protected:
@@ -32,7 +33,7 @@ class XQueryLiteral : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  Value _value;
+  const XQueryLiteralCopies _value;
 };
 
 class XQueryVariable : public XQueryExpr {

@@ -43,6 +43,10 @@ class XQueryNumber : public NSNumber {
   [[nodiscard]] static Ref<XQueryNumber> unsignedIntWithNumber(const NSNumber& number);
   [[nodiscard]] static Ref<XQueryNumber> unsignedShortWithNumber(const NSNumber& number);
   [[nodiscard]] static Ref<XQueryNumber> unsignedByteWithNumber(const NSNumber& number);
+  // Another object of the same type and value.
+  [[nodiscard]] static Ref<XQueryNumber> copyOf(const XQueryNumber& number) {
+    return make<XQueryNumber>(number.typeID(), static_cast<const NSNumber&>(number));
+  }
   // A decimal.
   [[nodiscard]] static Ref<XQueryNumber> numberWithDecimal(NSDecimal value);
   // Of a given decimal-based type, unchecked: the caller knows that the value fits.

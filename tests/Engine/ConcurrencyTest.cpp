@@ -34,6 +34,9 @@ constexpr Work works[] = {
     {"Constructors",
      "for $b in //book[price < 20] return <found at='{$b/@id}' n=\"{1, 2}\">{$b/title, "
      "attribute late {1}, text {'x', 1}, comment {'c'}, processing-instruction p {'q'}}</found>"},
+    {"Literals",
+     "count(//book/(7)), count(//book/('text')), for $i in 1 to 100 return ($i + 1, 'seven', 1.5, "
+     "2e0, -1, 'a literal of more than twenty-four units', xs:token('token'), <e a='1'>text</e>)"},
     {"ComputedNames",
      "for $i in 1 to 20 return element {concat('e', $i)} {attribute {concat('a', $i)} {$i}}"},
     {"ConstantNodes", "(<!-- same -->, <?same pi?>, <e><!-- in --></e>, <f a='1'/>)"},
@@ -483,6 +486,33 @@ TEST(Concurrency, QueryAndDocumentEndWhileOthersGoOn) {
     EXPECT_EQ(together([&](int thread, Complaints& complaints) {
                 auto share = std::move(shares[static_cast<size_t>(thread)]);
                 if (evaluated(*share.first, share.second) != expected) complaints.add("result");
+              }),
+              none);
+  }
+}
+
+// What the threads found is read, and let go of, by others, when all that it came from is gone.
+TEST(Concurrency, ResultsOutliveWhatTheyCameFrom) {
+  constexpr const char* source =
+      "//book[price > 50]/title, 7, 'a literal of more than twenty-four units', <!-- c -->, "
+      "<made at='{//book[1]/@id}'>{//book[2]}</made>, //title/string(), 1 + 1";
+  const std::string expected = evaluated(source, parsed(library(10)));
+  for (int round = 0; round < 5; ++round) {
+    std::vector<Ref<NSArray>> results(threadCount);
+    {
+      const auto query = XQuery::xqueryWithSource(source);
+      const Value document = parsed(library(10));
+      EXPECT_EQ(together([&](int thread, Complaints& complaints) {
+                  Ref<XQueryError> error;
+                  auto& items = results[static_cast<size_t>(thread)];
+                  items = newContext()->evaluateXQuery(*query, {}, document, &error);
+                  if (!items) complaints.add("no result");
+                }),
+                none);
+    }
+    EXPECT_EQ(together([&](int thread, Complaints& complaints) {
+                auto items = std::move(results[static_cast<size_t>((thread + 1) % threadCount)]);
+                if (printed(items, nullptr) != expected) complaints.add("result");
               }),
               none);
   }
