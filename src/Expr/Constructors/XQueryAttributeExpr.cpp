@@ -2,6 +2,7 @@
 
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
+#include "Expr/BorrowedValue.h"
 #include "Expr/Constructors/XQueryContent.h"
 #include "Expr/Constructors/XQueryContentText.h"
 #include "Expr/XQueryLeaves.h"
@@ -62,9 +63,9 @@ bool XQueryAttributeExpr::addTo(XQueryElementContent& content, XQueryContext& co
 
 bool XQueryAttributeExpr::appendValueText(NSMutableString& text, XQueryContext& context) const {
   for (const auto& item : _items) {
-    const Value value = item->evaluateWithContext(context);
-    if (XQueryHasFailed(value, context)) return false;
-    XQueryAppendText(value, text, context);
+    const XQueryBorrowedValue value(*item, context);
+    if (XQueryHasFailed(*value, context)) return false;
+    XQueryAppendText(*value, text, context);
   }
   XQueryNormalizeAttributeString(text);
   return true;

@@ -2,6 +2,7 @@
 
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
+#include "Expr/BorrowedValue.h"
 #include "Expr/Constructors/XQueryAttributeExpr.h"
 #include "Expr/Constructors/XQueryContent.h"
 #include "Expr/Constructors/XQueryContentText.h"
@@ -10,6 +11,7 @@
 #include "Expr/Constructors/XQueryNodeExprs.h"
 #include "Expr/XQueryLeaves.h"
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Credit.h"
 #include "Prolog/XQueryProlog.h"
 
 #include <algorithm>
@@ -42,9 +44,9 @@ void collectNamespaces(const XQueryElementExpr::Exprs& exprs,
 
 // False for an error.
 bool addValue(const XQueryExpr& expr, XQueryElementContent& content, XQueryContext& context) {
-  const Value value = expr.evaluateWithContext(context);
-  if (XQueryHasFailed(value, context)) return false;
-  content.add(value);
+  const XQueryBorrowedValue value(expr, context);
+  if (XQueryHasFailed(*value, context)) return false;
+  content.add(*value);
   return true;
 }
 
@@ -95,7 +97,10 @@ Value XQueryElementExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   auto& dynamic = context._internal();
   XQueryInScopeNamespaces namespaces(dynamic);
-  if (!_namespaces.empty()) namespaces.push(_namespaces);
+  if (!_namespaces.empty()) {
+    for (const auto& declaration : _namespaces) NSXMLCredit::take(declaration.get());
+    namespaces.push(_namespaces);
+  }
   NSXMLNameRef name = _name.evaluate(context, exprLine());
   if (!name) return {};
   NSXMLRoom room;

@@ -2,6 +2,7 @@
 
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
+#include "Expr/BorrowedValue.h"
 #include "Expr/Operators/XQueryArithmetic.h"
 #include "Expr/Operators/XQueryComparison.h"
 #include "Expr/Operators/XQueryRange.h"
@@ -156,25 +157,31 @@ void XQueryOperatorExpr::bindInfoForProlog(XQueryProlog& prolog) {
 
 Value XQueryOperatorExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
-  if (isa<XQueryOperatorExpr>(_left.get())) return evaluateChain(context);
-  if (!_left) return evaluateWithLeftValue(Value(), context);
-  const Value left = _left->evaluateWithContext(context);
-  if (XQueryHasFailed(left, context)) return {};
-  return evaluateWithLeftValue(left, context);
+  return isa<XQueryOperatorExpr>(_left.get()) ? evaluateChain(context) : evaluateAlone(context);
 }
 
 Value XQueryOperatorExpr::evaluateChain(XQueryContext& context) const {
   const LeftSpine<const XQueryOperatorExpr> spine(this);
-  Value value;
-  if (const XQueryExpr* innermost = spine[spine.count() - 1]->left()) {
-    value = innermost->evaluateWithContext(context);
+  size_t index = spine.count() - 1;
+  Value value = spine[index]->evaluateAlone(context);
+  while (index-- > 0) {
     if (XQueryHasFailed(value, context)) return {};
-  }
-  for (size_t index = spine.count(); index-- > 0;) {
     value = spine[index]->evaluateWithLeftValue(value, context);
-    if (XQueryHasFailed(value, context)) return {};
   }
   return value;
+}
+
+// For a left operand that is no operator.
+Value XQueryOperatorExpr::evaluateAlone(XQueryContext& context) const {
+  if (!_left) return evaluateWithLeftValue(Value(), context);
+  if (_left->kind() == Kind::Literal || XQueryBorrowedValue::outlives(*_right)) {
+    const XQueryBorrowedValue left(*_left, context);
+    if (XQueryHasFailed(*left, context)) return {};
+    return evaluateWithLeftValue(*left, context);
+  }
+  const Value left = _left->evaluateWithContext(context);
+  if (XQueryHasFailed(left, context)) return {};
+  return evaluateWithLeftValue(left, context);
 }
 
 Value XQueryOperatorExpr::evaluateWithLeftValue(const Value& left, XQueryContext& context) const {
@@ -188,9 +195,9 @@ Value XQueryOperatorExpr::evaluateWithLeftValue(const Value& left, XQueryContext
   if (const XQueryOperatorExpr* range = rangeToCompareWith()) {
     return evaluateWithRange(left, *range, context);
   }
-  const Value right = _right->evaluateWithContext(context);
-  if (XQueryHasFailed(right, context)) return {};
-  return answerFor(left, right, context);
+  const XQueryBorrowedValue right(*_right, context);
+  if (XQueryHasFailed(*right, context)) return {};
+  return answerFor(left, *right, context);
 }
 
 // What cannot be answered is an error.
@@ -242,8 +249,9 @@ Value XQueryOperatorExpr::evaluateWithRange(const Value& left, const XQueryOpera
 }
 
 // A left operand that was never set is the empty sequence for every operator but the signs.
-Value XQueryOperatorExpr::leftOrEmpty(const Value& left) const {
-  return _left ? left : Value(NSNull::null());
+const Value& XQueryOperatorExpr::leftOrEmpty(const Value& left) const {
+  static const Value empty(NSNull::null());
+  return _left ? left : empty;
 }
 
 int XQueryOperatorExpr::operatorClassification(int type) {

@@ -105,12 +105,13 @@ class XQueryOperatorExpr : public XQueryExpr {
  private:
   // Out of line: the list of a chain's operators is no part of a recursion's frames otherwise.
   [[gnu::noinline]] Value evaluateChain(XQueryContext& context) const;
+  Value evaluateAlone(XQueryContext& context) const;
   Value evaluateWithLeftValue(const Value& left, XQueryContext& context) const;
   Value evaluateWithRange(const Value& left, const XQueryOperatorExpr& range,
                           XQueryContext& context) const;
   const XQueryOperatorExpr* rangeToCompareWith() const;
   Value answerFor(const Value& left, const Value& right, XQueryContext& context) const;
-  Value leftOrEmpty(const Value& left) const;
+  const Value& leftOrEmpty(const Value& left) const;
 
   int _type;
   Ref<XQueryExpr> _left;
