@@ -15,6 +15,7 @@
 #include <string>
 #include <sys/wait.h>
 #include <thread>
+#include <time.h>
 #include <unistd.h>
 #include <vector>
 
@@ -50,7 +51,7 @@ constexpr KindRow rows[] = {
      "<all>{for $p in /site/people/person return <p id='{$p/@id}'>{$p/name, "
      "string($p/emailaddress)}</p>}</all>"},
     {"construction with namespaces",
-     "declare namespace p = 'urn:p'; declare base-uri 'http://h/'; for $x in 1 to 500 return "
+     "declare base-uri 'http://h/'; declare namespace p = 'urn:p'; for $x in 1 to 500 return "
      "<p:e xmlns:q='urn:q'><q:f a='1'/></p:e>"},
     {"comments and instructions", "for $x in 1 to 1000 return (<!-- c -->, <?p i?>)"},
     {"text",
@@ -76,6 +77,18 @@ constexpr int rounds = 7;
 constexpr std::chrono::milliseconds warmUp{20};
 constexpr std::chrono::milliseconds span{150};
 
+struct Figure {
+  double rate = 0;           // evaluations in a second
+  double processorTime = 0;  // of one evaluation, in seconds
+};
+
+// What the calling thread has taken so far.
+double processorSeconds() {
+  timespec time = {};
+  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
+  return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
+}
+
 // How long the calling thread was ready to run and did not, for want of a processor. 0 where the
 // kernel does not tell.
 double secondsInQueue() {
@@ -95,45 +108,48 @@ size_t evaluateFor(Clock::duration time, XQueryContext& context, const XQuery& q
   return count;
 }
 
-// Evaluations in a second of the calling thread, the time apart that others took from it.
-double rateHere(XQueryContext& context, const XQuery& query, const Value& document) {
+// Of the calling thread, the time apart that others took from it.
+Figure figureHere(XQueryContext& context, const XQuery& query, const Value& document) {
   evaluateFor(warmUp, context, query, document);
   const double queuedBefore = secondsInQueue();
+  const double processorBefore = processorSeconds();
   const auto start = Clock::now();
-  const size_t count = evaluateFor(span, context, query, document);
+  const auto count = static_cast<double>(evaluateFor(span, context, query, document));
   const double taken = std::chrono::duration<double>(Clock::now() - start).count();
-  const double rate = static_cast<double>(count) / (taken - (secondsInQueue() - queuedBefore));
+  const double processor = processorSeconds() - processorBefore;
+  const Figure figure = {count / (taken - (secondsInQueue() - queuedBefore)), processor / count};
   // Nobody measures while another is done already.
   evaluateFor(warmUp, context, query, document);
-  return rate;
+  return figure;
 }
 
-double rateAlone(const KindRow& row, const std::string& xml) {
-  return rateHere(*XQueryContext::xqueryContext(), *compile(row.query), parse(xml));
+Figure figureAlone(const KindRow& row, const std::string& xml) {
+  return figureHere(*XQueryContext::xqueryContext(), *compile(row.query), parse(xml));
 }
 
-double rateOfTwo(const KindRow& row, const std::string& xml, bool share) {
+Figure figureOfTwo(const KindRow& row, const std::string& xml, bool share) {
   constexpr int threadCount = 2;
   const auto sharedQuery = compile(row.query);
   const Value sharedDocument = parse(xml);
   std::barrier together(threadCount);
-  double rates[threadCount] = {};
+  Figure figures[threadCount];
   std::vector<std::thread> threads;
-  for (double& rate : rates) {
+  for (Figure& figure : figures) {
     threads.emplace_back([&] {
       const auto query = share ? sharedQuery : compile(row.query);
       const Value document = share ? sharedDocument : Value(parse(xml));
       const auto context = XQueryContext::xqueryContext();
       together.arrive_and_wait();
-      rate = rateHere(*context, *query, document);
+      figure = figureHere(*context, *query, document);
     });
   }
   for (auto& thread : threads) thread.join();
-  return rates[0] + rates[1];
+  return {figures[0].rate + figures[1].rate,
+          (figures[0].processorTime + figures[1].processorTime) / threadCount};
 }
 
 // The figure, from a copy of this process.
-double measured(const KindRow& row, const std::string& xml, Mode mode) {
+Figure measured(const KindRow& row, const std::string& xml, Mode mode) {
   int ends[2];
   if (pipe(ends) != 0) throw std::runtime_error("no pipe");
   const pid_t child = fork();
@@ -141,26 +157,33 @@ double measured(const KindRow& row, const std::string& xml, Mode mode) {
   if (child == 0) {
     int status = 1;
     try {
-      const double rate =
-          mode == Alone ? rateAlone(row, xml) : rateOfTwo(row, xml, mode == Sharing);
-      status = write(ends[1], &rate, sizeof rate) == sizeof rate ? 0 : 1;
+      const Figure figure =
+          mode == Alone ? figureAlone(row, xml) : figureOfTwo(row, xml, mode == Sharing);
+      status = write(ends[1], &figure, sizeof figure) == sizeof figure ? 0 : 1;
     } catch (const std::exception& exception) {
       std::fprintf(stderr, "%s: %s\n", row.kind, exception.what());
     }
     _exit(status);
   }
   close(ends[1]);
-  double rate = 0;
-  const bool isRead = read(ends[0], &rate, sizeof rate) == sizeof rate;
+  Figure figure;
+  const bool isRead = read(ends[0], &figure, sizeof figure) == sizeof figure;
   close(ends[0]);
   waitpid(child, nullptr, 0);
   if (!isRead) throw std::runtime_error("a kind cannot be measured");
-  return rate;
+  return figure;
 }
 
-double median(std::vector<double>& values) {
-  std::nth_element(values.begin(), values.begin() + values.size() / 2, values.end());
-  return values[values.size() / 2];
+// Of each member by itself.
+Figure median(std::vector<Figure>& figures) {
+  const auto middle = figures.begin() + figures.size() / 2;
+  Figure result;
+  for (double Figure::*member : {&Figure::rate, &Figure::processorTime}) {
+    std::nth_element(figures.begin(), middle, figures.end(),
+                     [member](const Figure& a, const Figure& b) { return a.*member < b.*member; });
+    result.*member = *middle.*member;
+  }
+  return result;
 }
 
 }  // namespace
@@ -168,20 +191,21 @@ double median(std::vector<double>& values) {
 int reportThreads() {
   const std::string xml = auctionData(0.01);
   bool isEnough = true;
-  std::printf("%-30s %14s %8s %8s\n", "", "alone", "sharing", "apart");
+  std::printf("%-30s %14s %8s %8s %14s\n", "", "alone", "sharing", "apart", "processor time");
   for (const KindRow& row : rows) {
-    std::vector<double> rates[modeCount];
+    std::vector<Figure> figures[modeCount];
     for (int round = 0; round < rounds; round++) {
       for (int mode = 0; mode < modeCount; mode++) {
-        rates[mode].push_back(measured(row, xml, static_cast<Mode>(mode)));
+        figures[mode].push_back(measured(row, xml, static_cast<Mode>(mode)));
       }
     }
-    const double alone = median(rates[Alone]);
-    const double sharing = median(rates[Sharing]) / alone;
-    const double apart = median(rates[Apart]) / alone;
+    const Figure alone = median(figures[Alone]);
+    const Figure shared = median(figures[Sharing]);
+    const double sharing = shared.rate / alone.rate;
+    const double apart = median(figures[Apart]).rate / alone.rate;
     const bool keepsUp = sharing >= 1.8 || sharing >= apart * 0.95;
-    std::printf("%-30s %12.1f/s %8.2f %8.2f%s\n", row.kind, alone, sharing, apart,
-                keepsUp ? "" : "  !");
+    std::printf("%-30s %12.1f/s %8.2f %8.2f %14.2f%s\n", row.kind, alone.rate, sharing, apart,
+                shared.processorTime / alone.processorTime, keepsUp ? "" : "  !");
     std::fflush(stdout);
     isEnough = isEnough && keepsUp;
   }
