@@ -7,6 +7,7 @@
 #include "Engine/XQueryInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/HostFailure.h"
+#include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/Credit.h"
@@ -51,6 +52,7 @@ Internal compiledWithin(const XQueryLimits& limits, const std::function<Internal
 
 // Without limits of its own a compilation that is part of an evaluation ends with that one.
 Internal compiled(const XQueryLimits& limits, const std::function<Internal()>& compile) {
+  const LastingObjects lasting;
   try {
     return isLimited(limits) ? compiledWithin(limits, compile) : compile();
   } catch (const HostFailure& failure) {
@@ -100,7 +102,10 @@ Ref<XQuery> XQuery::xqueryWithSource(std::string_view source, const XQueryLoadin
 XQuery::XQuery(std::unique_ptr<XQueryInternal> internal)
     : NSCounted(Kind::Query), _private(std::move(internal)) {}
 
-XQuery::~XQuery() = default;
+XQuery::~XQuery() {
+  const LastingObjects lasting;
+  _private.reset();
+}
 
 Ref<NSArray> XQuery::parseErrors() const {
   if (!_private->isError()) return {};

@@ -1,5 +1,6 @@
 #include "Expr/LiteralCopies.h"
 
+#include "Platform/Base/LastingObjects.h"
 #include "Platform/Tree/Credit.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"
@@ -18,6 +19,7 @@ bool isShortText(const NSObject* object) {
 }
 
 Ref<NSCounted> copyOf(const NSObject* object) {
+  const LastingObjects lasting;
   if (const auto* number = dyn_cast<XQueryNumber>(object)) return XQueryNumber::copyOf(*number);
   return XQueryString::stringWithView(cast<XQueryString>(object)->view());
 }

@@ -1,6 +1,7 @@
 #include "Expr/XQueryLeaves.h"
 
 #include "Context/XQueryContextInternal.h"
+#include "Platform/Base/LastingObjects.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
@@ -72,6 +73,7 @@ Value XQueryVariable::computeValue(XQueryContext& context) const {
 
 XQueryContextItem* XQueryContextItem::contextItem() {
   static XQueryContextItem* const shared = [] {
+    const LastingObjects lasting;
     auto* item = new XQueryContextItem();
     item->makeImmortal();
     return item;

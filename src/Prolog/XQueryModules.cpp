@@ -1,5 +1,6 @@
 #include "Prolog/XQueryModules.h"
 
+#include "Platform/Base/LastingObjects.h"
 #include "Prolog/XQueryProlog.h"
 
 #include <array>
@@ -27,6 +28,7 @@ constexpr std::array<std::string_view, XQueryNamespaceFirstUser> builtinURIs = {
 using BuiltinNamespaces = std::array<Ref<NSString>, XQueryNamespaceFirstUser>;
 
 BuiltinNamespaces makeBuiltinNamespaces() {
+  const LastingObjects lasting;
   BuiltinNamespaces namespaces;
   for (size_t id = 1; id < builtinURIs.size(); ++id) {
     namespaces[id] = NSString::stringWithASCII(builtinURIs[id]);

@@ -3,6 +3,7 @@
 // stands for which ID.
 #include "Prolog/XQueryProlog.h"
 
+#include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryDeclarations.h"
@@ -43,6 +44,7 @@ using PrefixSlots = std::array<Value, prefixSlotCount>;
 // its own, each stands one place below its ID. What prefix a constructed element gets depends on
 // this.
 PrefixSlots makePredeclaredSlots() {
+  const LastingObjects lasting;
   PrefixSlots slots;
   slots[0] = slots[1] = NSNull::null();
   for (size_t index = 0; index < predeclaredPrefixes.size(); ++index) {

@@ -1,6 +1,7 @@
 // Making typed numbers and printing them.
 #include "Types/XQueryNumber.h"
 
+#include "Platform/Base/LastingObjects.h"
 #include "Types/DurationReader.h"
 #include "xquery/Date.h"
 
@@ -51,7 +52,10 @@ bool admits(const IntegerRule& rule, double value, int sign) {
 }
 
 // A shared value is made once and never freed.
-XQueryNumber* shared(Ref<XQueryNumber> number) {
+template <class Number>
+XQueryNumber* sharedDouble(Number value) {
+  const LastingObjects lasting;
+  auto number = make<XQueryNumber>(XQueryTypeDouble, std::move(value));
   number->makeImmortal();
   return number.detach();
 }
@@ -154,28 +158,27 @@ bool readSeconds(DurationReader& reader, double& seconds) {
 }  // namespace
 
 XQueryNumber* XQueryNumber::posInf() {
-  static XQueryNumber* const number = shared(make<XQueryNumber>(XQueryTypeDouble, infinity));
+  static XQueryNumber* const number = sharedDouble(infinity);
   return number;
 }
 
 XQueryNumber* XQueryNumber::negInf() {
-  static XQueryNumber* const number = shared(make<XQueryNumber>(XQueryTypeDouble, -infinity));
+  static XQueryNumber* const number = sharedDouble(-infinity);
   return number;
 }
 
 XQueryNumber* XQueryNumber::nan() {
-  static XQueryNumber* const number =
-      shared(make<XQueryNumber>(XQueryTypeDouble, NSDecimal::notANumber()));
+  static XQueryNumber* const number = sharedDouble(NSDecimal::notANumber());
   return number;
 }
 
 XQueryNumber* XQueryNumber::zero() {
-  static XQueryNumber* const number = shared(make<XQueryNumber>(XQueryTypeDouble, NSDecimal(0)));
+  static XQueryNumber* const number = sharedDouble(NSDecimal(0));
   return number;
 }
 
 XQueryNumber* XQueryNumber::one() {
-  static XQueryNumber* const number = shared(make<XQueryNumber>(XQueryTypeDouble, NSDecimal(1)));
+  static XQueryNumber* const number = sharedDouble(NSDecimal(1));
   return number;
 }
 

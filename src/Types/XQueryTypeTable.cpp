@@ -5,6 +5,7 @@
 // `derives`, which also answers for numbers that are no type.
 #include "Types/XQueryTypeTable.h"
 
+#include "Platform/Base/LastingObjects.h"
 #include "Types/SafeNSArrayAdd.h"
 #include "Types/XQueryDate.h"
 #include "Types/XQueryNumber.h"
@@ -145,6 +146,7 @@ struct TypeTables {
       sXQueryNameIDMappings;
 
   TypeTables() {
+    const LastingObjects lasting;
     const Ref<NSString> xs = immortalText(xsNamespace);
     const Ref<NSString> xdt = immortalText(xdtNamespace);
     for (const TypeName& row : typeNames) {

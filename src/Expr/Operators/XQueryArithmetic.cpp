@@ -2,6 +2,7 @@
 
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/Base/LastingObjects.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryDateArithmetic.h"
@@ -394,6 +395,7 @@ Value XQueryUnarySignPlainly(int type, const Value& operand, XQueryContext& cont
 Value XQueryUnarySign(int type, const Value& operand, XQueryContext& context) {
   // Where the shortcut applies, adding to an integer leaves every operand in its own type.
   static const Ref<XQueryNumber> zero = [] {
+    const LastingObjects lasting;
     Ref<XQueryNumber> integer = XQueryNumber::integerWithInt64(0);
     integer->makeImmortal();
     return integer;

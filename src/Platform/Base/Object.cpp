@@ -1,12 +1,16 @@
 // The object allocator and the destruction of object graphs.
 //
-// Blocks of up to 128 bytes are kept in lists by size, 16 bytes apart. A thread works on two lists
-// of each size without any lock: the one in use and a full one in reserve. A thread that fills both
-// hands the full one to the process, and a thread that runs dry takes one from there before it
-// carves new blocks from a chunk; so one thread may for ever make what another frees without the
-// process growing.
+// Blocks of up to 128 bytes are kept in lists by size, 16 bytes apart. A thread works on some lists
+// of each size without any lock: the one in use and full ones in reserve, enough for a result of
+// some thousand items, which would go from processor to processor otherwise. A thread that has no
+// place for a full one hands it to the process, and a thread that runs dry takes one from there
+// before it carves new blocks from a chunk; so one thread may for ever make what another frees
+// without the process growing.
 //
 //   free block   | next block of the list | next list (first block of a list of the process) | ...
+//
+// There are two sets of lists, for objects that come and go and for those that last
+// (LastingObjects.h). A thread works on one of the sets; the other one waits.
 //
 // Chunks are given back on request only: memory that a large result needed once stays ready for the
 // next one.
@@ -14,6 +18,7 @@
 #include "xquery/Object.h"
 
 #include "Platform/Base/Abandoned.h"
+#include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/ObjectBlocks.h"
 #include "Platform/Base/WorkMeter.h"
 #include "xquery/Collection.h"
@@ -25,6 +30,7 @@
 #include <malloc.h>
 #include <mutex>
 #include <new>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -40,8 +46,10 @@ constexpr bool usesFreeLists = true;
 constexpr size_t granule = 16;
 constexpr size_t largestBlock = 128;
 constexpr size_t sizeCount = largestBlock / granule;
+constexpr size_t setCount = 2;
 constexpr size_t chunkBytes = size_t{64} * 1024;
 constexpr uint32_t listLength = 256;
+constexpr size_t reserveBytes = size_t{256} * 1024;  // of each size
 
 struct FreeBlock {
   FreeBlock* next;
@@ -51,7 +59,8 @@ struct FreeBlock {
 struct BlockList {
   FreeBlock* first = nullptr;
   uint32_t length = 0;
-  FreeBlock* reserve = nullptr;  // a list of `listLength` blocks, or null
+  FreeBlock* reserve = nullptr;  // lists of `listLength` blocks, each with the next one
+  uint32_t reserveCount = 0;
 };
 
 // Objects whose destruction waits until the ones above them on the stack are done.
@@ -61,11 +70,17 @@ struct PendingObjects {
   size_t capacity = 0;
 };
 
-// All that a thread keeps; needs no construction, so that reaching it is one instruction.
-struct ThreadState {
+// For objects of one use.
+struct BlockSet {
   BlockList lists[sizeCount];
   unsigned char* chunk = nullptr;  // what is left of the chunk being carved
   size_t chunkLeft = 0;
+};
+
+// All that a thread keeps; needs no construction, so that reaching it is one instruction.
+struct ThreadState : BlockSet {
+  BlockSet waiting;
+  bool isLasting = false;  // which of the sets the thread works on
   bool closesAtExit = false;
   uint32_t destructionDepth = 0;
   PendingObjects pending;
@@ -76,7 +91,7 @@ constinit thread_local ThreadState threadState __attribute__((tls_model("initial
 // What threads hand to each other: per size a stack of lists.
 struct SharedLists {
   std::mutex mutex;
-  FreeBlock* lists[sizeCount] = {};
+  FreeBlock* lists[setCount][sizeCount] = {};
   // Every chunk, chained through its first word, so that leak checkers find the memory in use.
   void* chunks = nullptr;
 };
@@ -88,19 +103,31 @@ SharedLists& sharedLists() {
   return *shared;
 }
 
-void giveList(size_t sizeIndex, FreeBlock* list) {
+void giveList(bool isLasting, size_t sizeIndex, FreeBlock* list) {
   SharedLists& shared = sharedLists();
   const std::lock_guard<std::mutex> guard(shared.mutex);
-  list->nextList = shared.lists[sizeIndex];
-  shared.lists[sizeIndex] = list;
+  list->nextList = shared.lists[isLasting][sizeIndex];
+  shared.lists[isLasting][sizeIndex] = list;
 }
 
+void giveList(size_t sizeIndex, FreeBlock* list) {
+  giveList(threadState.isLasting, sizeIndex, list);
+}
+
+// Of the other use if need be: what was made for one may have been freed for the other.
 FreeBlock* takeList(size_t sizeIndex) {
   SharedLists& shared = sharedLists();
   const std::lock_guard<std::mutex> guard(shared.mutex);
-  FreeBlock* list = shared.lists[sizeIndex];
-  if (list) shared.lists[sizeIndex] = list->nextList;
-  return list;
+  for (const bool isLasting : {threadState.isLasting, !threadState.isLasting}) {
+    FreeBlock*& lists = shared.lists[isLasting][sizeIndex];
+    if (lists) return std::exchange(lists, lists->nextList);
+  }
+  return nullptr;
+}
+
+void changeSets() {
+  std::swap(static_cast<BlockSet&>(threadState), threadState.waiting);
+  threadState.isLasting = !threadState.isLasting;
 }
 
 // Gives the next bytes of the chunk, a multiple of the granule, to the process as one block.
@@ -110,6 +137,20 @@ void giveRemainder(size_t size) {
   giveList(size / granule - 1, block);
   threadState.chunk += size;
   threadState.chunkLeft -= size;
+}
+
+// Gives everything the thread holds of the set it works on to the process.
+void giveSet() {
+  for (size_t index = 0; index < sizeCount; ++index) {
+    BlockList& blocks = threadState.lists[index];
+    if (blocks.first) giveList(index, blocks.first);
+    while (blocks.reserve) giveList(index, std::exchange(blocks.reserve, blocks.reserve->nextList));
+    blocks = BlockList();
+  }
+  // The rest of the chunk becomes blocks of the largest size that fits.
+  while (threadState.chunkLeft >= granule) {
+    giveRemainder(std::min(threadState.chunkLeft, largestBlock));
+  }
 }
 
 struct ThreadExit {
@@ -155,12 +196,32 @@ void carveBlocks(size_t sizeIndex) {
   }
 }
 
+FreeBlock* takeReserve(BlockList& blocks) {
+  FreeBlock* list = blocks.reserve;
+  if (!list) return nullptr;
+  blocks.reserve = list->nextList;
+  --blocks.reserveCount;
+  return list;
+}
+
+void keepInReserve(size_t sizeIndex, FreeBlock* list) {
+  BlockList& blocks = threadState.lists[sizeIndex];
+  if (blocks.reserveCount >= reserveBytes / (listLength * (sizeIndex + 1) * granule)) {
+    giveList(sizeIndex, list);
+    return;
+  }
+  list->nextList = blocks.reserve;
+  blocks.reserve = list;
+  ++blocks.reserveCount;
+}
+
 // The list in use is empty.
 [[gnu::noinline]] void* allocateSlowly(size_t sizeIndex) {
   ThreadState& state = threadState;
   if (!state.closesAtExit) closeAtThreadExit();
   BlockList& blocks = state.lists[sizeIndex];
-  FreeBlock* list = blocks.reserve ? std::exchange(blocks.reserve, nullptr) : takeList(sizeIndex);
+  FreeBlock* list = takeReserve(blocks);
+  if (!list) list = takeList(sizeIndex);
   if (list) {
     blocks.first = list->next;
     // A list left by a thread that ended may be shorter; the length only paces the exchange.
@@ -183,8 +244,7 @@ void carveBlocks(size_t sizeIndex) {
     blocks.length = 0;
     return;
   }
-  if (blocks.reserve) giveList(sizeIndex, blocks.reserve);
-  blocks.reserve = std::exchange(blocks.first, nullptr);
+  keepInReserve(sizeIndex, std::exchange(blocks.first, nullptr));
   blocks.length = 0;
 }
 
@@ -201,18 +261,21 @@ class IdleBlocks {
     }
     std::sort(_chunks.begin(), _chunks.end(),
               [](const Chunk& a, const Chunk& b) { return a.first < b.first; });
-    std::swap_ranges(std::begin(_lists), std::end(_lists), std::begin(shared.lists));
+    std::swap(_lists, shared.lists);
   }
 
   void giveBack() {
-    forEachBlock([this](size_t index, FreeBlock* block) {
+    forEachBlock([this](bool, size_t index, FreeBlock* block) {
       chunkOf(block)->idleBytes += (index + 1) * granule;
     });
-    forEachBlock([this](size_t index, FreeBlock* block) {
-      if (!isIdle(*chunkOf(block))) keep(index, block);
+    forEachBlock([this](bool isLasting, size_t index, FreeBlock* block) {
+      if (!isIdle(*chunkOf(block))) keep(isLasting, index, block);
     });
-    for (size_t index = 0; index < sizeCount; ++index) {
-      if (_kept[index].first) giveList(index, _kept[index].first);
+    for (const bool isLasting : {false, true}) {
+      for (size_t index = 0; index < sizeCount; ++index) {
+        FreeBlock* kept = _kept[isLasting][index].first;
+        if (kept) giveList(isLasting, index, kept);
+      }
     }
     unchain();
     for (const Chunk& chunk : _chunks) {
@@ -230,16 +293,23 @@ class IdleBlocks {
 
   template <class Work>
   void forEachBlock(Work work) {
-    for (size_t index = 0; index < sizeCount; ++index) {
-      for (FreeBlock* list = _lists[index]; list;) {
-        FreeBlock* const nextList = list->nextList;
-        for (FreeBlock* block = list; block;) {
-          FreeBlock* const next = block->next;
-          work(index, block);
-          block = next;
-        }
-        list = nextList;
+    for (const bool isLasting : {false, true}) {
+      for (size_t index = 0; index < sizeCount; ++index) {
+        forEachBlock(_lists[isLasting][index],
+                     [&](FreeBlock* block) { work(isLasting, index, block); });
       }
+    }
+  }
+  template <class Work>
+  static void forEachBlock(FreeBlock* list, Work work) {
+    while (list) {
+      FreeBlock* const nextList = list->nextList;
+      for (FreeBlock* block = list; block;) {
+        FreeBlock* const next = block->next;
+        work(block);
+        block = next;
+      }
+      list = nextList;
     }
   }
   // Null for what is in none of those that were there at the start.
@@ -251,10 +321,10 @@ class IdleBlocks {
     Chunk& chunk = *std::prev(after);
     return block < chunk.first + chunkBytes ? &chunk : nullptr;
   }
-  void keep(size_t index, FreeBlock* block) {
-    BlockList& kept = _kept[index];
+  void keep(bool isLasting, size_t index, FreeBlock* block) {
+    BlockList& kept = _kept[isLasting][index];
     if (kept.length == listLength) {
-      giveList(index, kept.first);
+      giveList(isLasting, index, kept.first);
       kept = BlockList();
     }
     block->next = kept.first;
@@ -279,8 +349,8 @@ class IdleBlocks {
   }
 
   std::vector<Chunk> _chunks;
-  FreeBlock* _lists[sizeCount] = {};
-  BlockList _kept[sizeCount];
+  FreeBlock* _lists[setCount][sizeCount] = {};
+  BlockList _kept[setCount][sizeCount];
 };
 
 bool pushPending(const NSCounted* object) {
@@ -313,16 +383,18 @@ bool isSetAside(const NSCounted* object, AbandonedValues::Free free) {
 }  // namespace
 
 void giveFreeBlocks() {
-  for (size_t index = 0; index < sizeCount; ++index) {
-    BlockList& blocks = threadState.lists[index];
-    if (blocks.first) giveList(index, blocks.first);
-    if (blocks.reserve) giveList(index, blocks.reserve);
-    blocks = BlockList();
+  for (size_t set = 0; set < setCount; ++set) {
+    giveSet();
+    changeSets();
   }
-  // The rest of the chunk becomes blocks of the largest size that fits.
-  while (threadState.chunkLeft >= granule) {
-    giveRemainder(std::min(threadState.chunkLeft, largestBlock));
-  }
+}
+
+LastingObjects::LastingObjects() : _isOutermost(!threadState.isLasting) {
+  if (_isOutermost) changeSets();
+}
+
+LastingObjects::~LastingObjects() {
+  if (_isOutermost) changeSets();
 }
 
 void* NSCounted::operator new(size_t size) {

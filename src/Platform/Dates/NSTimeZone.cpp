@@ -1,3 +1,4 @@
+#include "Platform/Base/LastingObjects.h"
 #include "Platform/Dates/ICUTimeZone.h"
 #include "xquery/Date.h"
 
@@ -42,12 +43,16 @@ Ref<NSTimeZone> NSTimeZone::timeZoneWithName(std::string_view name) {
 }
 
 NSTimeZone* NSTimeZone::GMT() {
-  static NSTimeZone* const zone = shared(make<NSTimeZone>(0, nullptr));
+  static NSTimeZone* const zone = [] {
+    const LastingObjects lasting;
+    return shared(make<NSTimeZone>(0, nullptr));
+  }();
   return zone;
 }
 
 NSTimeZone* NSTimeZone::localTimeZone() {
   static NSTimeZone* const zone = [] {
+    const LastingObjects lasting;
     OffsetOrRules local(ICUTimeZone::ofProcess());
     return shared(make<NSTimeZone>(local.offset, std::move(local.rules)));
   }();

@@ -1,3 +1,4 @@
+#include "Platform/Base/LastingObjects.h"
 #include "Platform/Numbers/NumberText.h"
 #include "xquery/Number.h"
 
@@ -43,9 +44,11 @@ std::string formatFloating(double value, bool single) {
   return single ? formatFloat(static_cast<float>(value)) : formatDouble(value);
 }
 
-NSNumber* sharedBoolean(const Ref<NSNumber>& value) {
-  value->makeImmortal();
-  return value.get();
+NSNumber* sharedBoolean(bool value) {
+  const LastingObjects lasting;
+  auto number = make<NSNumber>(Kind::Number, uint16_t{0}, value);
+  number->makeImmortal();
+  return number.detach();
 }
 
 }  // namespace
@@ -111,14 +114,12 @@ NSNumber::~NSNumber() {
 }
 
 NSNumber* NSNumber::trueValue() {
-  static const Ref<NSNumber> value = make<NSNumber>(Kind::Number, uint16_t{0}, true);
-  static NSNumber* const shared = sharedBoolean(value);
+  static NSNumber* const shared = sharedBoolean(true);
   return shared;
 }
 
 NSNumber* NSNumber::falseValue() {
-  static const Ref<NSNumber> value = make<NSNumber>(Kind::Number, uint16_t{0}, false);
-  static NSNumber* const shared = sharedBoolean(value);
+  static NSNumber* const shared = sharedBoolean(false);
   return shared;
 }
 

@@ -5,6 +5,7 @@
 //   InTree   in the arena of a tree, which `owner` keeps alive
 //   Shared   in the buffer of another string, which `owner` keeps alive
 //   none     in a buffer of its own
+#include "Platform/Base/LastingObjects.h"
 #include "Platform/Text/Blocks.h"
 #include "Platform/Text/UTF16.h"
 #include "Platform/Text/UTF8.h"
@@ -199,6 +200,7 @@ const Ref<NSString>& NSString::empty() {
   // The reference itself is never destroyed, so that destructors run at exit may still use it.
   alignas(Ref<NSString>) static unsigned char storage[sizeof(Ref<NSString>)];
   static const Ref<NSString>* const shared = [] {
+    const LastingObjects lasting;
     auto* reference = ::new (storage) Ref<NSString>(stringWithView({}));
     (*reference)->makeImmortal();
     return reference;

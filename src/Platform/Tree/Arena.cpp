@@ -1,6 +1,7 @@
 #include "Platform/Tree/Arena.h"
 
 #include "Platform/Base/Abandoned.h"
+#include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/UTF16.h"
 #include "Platform/Tree/Credit.h"
@@ -128,6 +129,8 @@ void NSXMLTree::destroy() {
   freeBaseURIs();
   freeBlocks();
   freeExtra();
+  std::optional<LastingObjects> lasting;
+  if (_era == 0) lasting.emplace();
   NSCounted::operator delete(this, sizeof(NSXMLTree));
 }
 

@@ -1,11 +1,20 @@
 #include "Platform/Tree/TreeBuilder.h"
 
+#include "Platform/Base/LastingObjects.h"
+
 #include <new>
 
 namespace xquery {
+namespace {
 
-NSXMLTreeBuilder::NSXMLTreeBuilder(size_t nodeBytes, size_t textBytes)
-    : _tree(NSXMLTree::create()) {
+NSXMLTree* lastingTree() {
+  const LastingObjects lasting;
+  return NSXMLTree::create();
+}
+
+}  // namespace
+
+NSXMLTreeBuilder::NSXMLTreeBuilder(size_t nodeBytes, size_t textBytes) : _tree(lastingTree()) {
   _tree->startBulk(nodeBytes, textBytes);
 }
 
