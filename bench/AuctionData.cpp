@@ -1,58 +1,17 @@
-// The document is written front to back from one stream of pseudo-random numbers (splitmix64, so no
-// library's idea of a distribution can change a byte). References between the parts are drawn from
-// the counts, which are fixed before the first element is written, so they always resolve.
-//
-// Prose is drawn from a vocabulary made of syllables with a skewed distribution: few words are
-// frequent and many are rare, as in a language, which keeps the text honest for substring searches.
+// The document is written front to back. References between the parts are drawn from the counts,
+// which are fixed before the first element is written, so they always resolve.
 #include "AuctionData.h"
+
+#include "DataWriter.h"
 
 #include <algorithm>
 #include <array>
-#include <cmath>
-#include <cstdint>
 #include <cstdio>
 #include <string_view>
-#include <vector>
 
 namespace bench {
 namespace {
 
-class Random {
- public:
-  explicit Random(uint64_t seed) : _state(seed) {}
-
-  uint64_t next() {
-    _state += 0x9E3779B97F4A7C15U;
-    uint64_t z = _state;
-    z = (z ^ (z >> 30)) * 0xBF58476D1CE4E5B9U;
-    z = (z ^ (z >> 27)) * 0x94D049BB133111EBU;
-    return z ^ (z >> 31);
-  }
-  // From 0 to limit - 1.
-  unsigned below(unsigned limit) { return static_cast<unsigned>((next() >> 32) * limit >> 32); }
-  unsigned between(unsigned low, unsigned high) { return low + below(high - low + 1); }
-  bool percent(unsigned chance) { return below(100) < chance; }
-  // Skewed towards 0.
-  unsigned skewed(unsigned limit) {
-    const uint64_t square = static_cast<uint64_t>(below(65536)) * below(65536);
-    return static_cast<unsigned>((square >> 16) * limit >> 16);
-  }
-  template <class Table>
-  std::string_view pick(const Table& table) {
-    return table[below(static_cast<unsigned>(table.size()))];
-  }
-
- private:
-  uint64_t _state;
-};
-
-constexpr std::array<std::string_view, 32> syllables = {
-    "ba", "cor", "den", "el",  "fa",  "gri", "ho",  "im", "jun", "ka", "lor",
-    "mi", "nes", "o",   "pra", "qui", "ra",  "sto", "ta", "un",  "ve", "wol",
-    "xa", "yor", "zi",  "bre", "ca",  "dul", "en",  "fo", "ger", "hil"};
-constexpr std::array<std::string_view, 8> countries = {
-    "United States", "Germany",     "Kenya",  "Japan",
-    "Brazil",        "New Zealand", "France", "Côte d'Ivoire"};
 constexpr std::array<std::string_view, 4> payments = {"Cash", "Creditcard", "Money order",
                                                       "Personal check"};
 constexpr std::array<std::string_view, 4> educations = {"High School", "College", "Graduate School",
@@ -72,17 +31,14 @@ constexpr std::array<Region, 6> regions = {{{"africa", 0.025},
 
 struct Counts {
   explicit Counts(double factor) {
-    const auto scaled = [factor](double whole) {
-      return static_cast<unsigned>(std::max(1.0, std::round(whole * factor)));
-    };
     for (size_t i = 0; i < regions.size(); i++) {
-      items[i] = scaled(22000 * regions[i].share);
+      items[i] = scaled(22000 * regions[i].share, factor);
       allItems += items[i];
     }
-    categories = scaled(1000);
-    people = scaled(25000);
-    openAuctions = scaled(12000);
-    closedAuctions = scaled(10000);
+    categories = scaled(1000, factor);
+    people = scaled(25000, factor);
+    openAuctions = scaled(12000, factor);
+    closedAuctions = scaled(10000, factor);
   }
 
   std::array<unsigned, regions.size()> items{};
@@ -90,15 +46,12 @@ struct Counts {
   unsigned categories, people, openAuctions, closedAuctions;
 };
 
-class Writer {
+class AuctionWriter : private DataWriter {
  public:
-  explicit Writer(double factor) : _counts(factor), _random(20041029) {
-    makeVocabulary();
-    _out.reserve(static_cast<size_t>(factor * 125e6) + 65536);
-  }
+  explicit AuctionWriter(double factor) : DataWriter(20041029, factor), _counts(factor) {}
 
   std::string document() {
-    _out += "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<site>\n";
+    _out += "<site>\n";
     writeRegions();
     writeCategories();
     writePeople();
@@ -109,57 +62,6 @@ class Writer {
   }
 
  private:
-  void makeVocabulary() {
-    _vocabulary.resize(4000);
-    for (std::string& word : _vocabulary) {
-      for (unsigned count = _random.between(1, 4); count > 0; count--) {
-        word += _random.pick(syllables);
-      }
-    }
-  }
-
-  // Appends literal text in which each "#" stands for the next number.
-  void put(std::string_view pattern, std::initializer_list<unsigned> numbers = {}) {
-    const unsigned* number = numbers.begin();
-    for (const char c : pattern) {
-      if (c == '#') {
-        _out += std::to_string(*number++);
-      } else {
-        _out += c;
-      }
-    }
-  }
-  void element(std::string_view name, std::string_view text) {
-    open(name);
-    _out += text;
-    close(name);
-  }
-  void open(std::string_view name) { (_out += '<') += name, _out += '>'; }
-  void close(std::string_view name) { ((_out += "</") += name) += ">\n"; }
-
-  std::string_view word() { return _vocabulary[_random.skewed(4000)]; }
-  std::string capitalised() {
-    std::string text(word());
-    text[0] = static_cast<char>(text[0] - 'a' + 'A');
-    return text;
-  }
-  std::string fullName() {
-    const std::string first = capitalised();
-    return first + " " + capitalised();
-  }
-  void words(unsigned count) {
-    for (; count > 0; count--) {
-      _out += word();
-      if (_random.below(200) == 0) _out += " &amp;";
-      if (count > 1) _out += ' ';
-    }
-  }
-  void money(std::string_view name, unsigned cents) {
-    char text[32];
-    std::snprintf(text, sizeof text, "%u.%02u", cents / 100, cents % 100);
-    element(name, text);
-  }
-  // Drawn into named variables, since the order in which arguments are evaluated is the compiler's.
   void date(std::string_view name) {
     const unsigned month = _random.between(1, 12), day = _random.between(1, 28);
     const unsigned year = _random.between(1998, 2004);
@@ -389,15 +291,12 @@ class Writer {
   }
 
   Counts _counts;
-  Random _random;
-  std::vector<std::string> _vocabulary;
-  std::string _out;
 };
 
 }  // namespace
 
 std::string auctionData(double factor) {
-  return Writer(factor).document();
+  return AuctionWriter(factor).document();
 }
 
 }  // namespace bench
