@@ -1,15 +1,18 @@
 // xquery_bench [--factor=F] [--scaling | --functions | --threads] [Google Benchmark options]
+// xquery_bench [--factor=F] --phrasings [--limit=SECONDS] [--ideas=TEXT]
 //
 // Measures the tree build, single steps (some with the memory that each takes at the peak), a table
-// of paths, each beside the peer's figure from the same run, and the queries of bench/queries over
-// auction data. The factor may also come from
-// XQUERY_BENCH_FACTOR; 0.1 (about 11 MB) is the default. Before a path is measured, both sides must
-// agree on the number of nodes it selects.
+// of paths, each beside the peer's figure from the same run, and the twenty numbered queries of
+// bench/queries over auction data. The factor may also come from XQUERY_BENCH_FACTOR; 0.1 (about
+// 11 MB) is the default. Before a path is measured, both sides must agree on the number of nodes it
+// selects. The other reports have headers of their own.
 #include "AuctionData.h"
 #include "Engine.h"
 #include "FunctionBench.h"
 #include "PeakMemory.h"
 #include "Peer.h"
+#include "Phrasings.h"
+#include "Queries.h"
 #include "Scaling.h"
 #include "Threads.h"
 
@@ -18,14 +21,11 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <malloc.h>
-#include <map>
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <unistd.h>
 #include <vector>
 
@@ -198,22 +198,12 @@ void runSteps(benchmark::State& state, const StepRow& row) {
   if (row.memory) state.counters["peak bytes/step"] = bench::peakBytesOf(row.query) / row.steps;
 }
 
-// One of the queries in bench/queries, by the name of its file.
 void runAuctionQuery(benchmark::State& state, const std::string& text) {
   const auto query = bench::compile(text);
   const auto context = XQueryContext::xqueryContext();
   size_t selected = 0;
   for (auto _ : state) selected = bench::evaluate(*context, *query, inputs.document);
   state.counters["items"] = static_cast<double>(selected);
-}
-
-std::map<std::string, std::string> auctionQueries() {
-  std::map<std::string, std::string> queries;
-  for (const auto& entry : std::filesystem::directory_iterator(XQUERY_BENCH_QUERIES)) {
-    std::ifstream file(entry.path(), std::ios::binary);
-    queries[entry.path().stem().string()].assign(std::istreambuf_iterator<char>(file), {});
-  }
-  return queries;
 }
 
 void registerAll() {
@@ -232,28 +222,51 @@ void registerAll() {
     add(name, runEngine, row);
     if (row.peer) add(name + " peer", runPeer, row);
   }
-  for (const auto& [name, text] : auctionQueries()) add("query " + name, runAuctionQuery, text);
+  for (const bench::PhrasedQuery& query : bench::phrasedQueries(XQUERY_BENCH_QUERIES)) {
+    if (!query.isOfTheTwenty()) continue;
+    if (query.phrasing != "plain" && query.phrasing != "published") continue;
+    add("query " + query.idea + " " + query.phrasing, runAuctionQuery, query.text);
+  }
+}
+
+struct Options {
+  bench::PhrasingOptions measured;  // the factor is everybody's
+  bool scaling = false, phrasings = false;
+};
+
+// Leaves `value` as it is when the text is no number within the bounds.
+bool readNumber(const char* text, double greatest, double& value) {
+  char* end = nullptr;
+  const double number = std::strtod(text, &end);
+  if (end == text || *end || !(number > 0 && number <= greatest)) return false;
+  value = number;
+  return true;
 }
 
 // Takes our own options out of the arguments. Empty when one is wrong.
-std::optional<double> takeFactor(int& argc, char** argv, bool& scaling) {
-  const char* text = std::getenv("XQUERY_BENCH_FACTOR");
+std::optional<Options> takeOptions(int& argc, char** argv) {
+  Options options;
+  const char* factor = std::getenv("XQUERY_BENCH_FACTOR");
   int kept = 1;
   for (int i = 1; i < argc; i++) {
-    if (std::strncmp(argv[i], "--factor=", 9) == 0) {
-      text = argv[i] + 9;
-    } else if (std::strcmp(argv[i], "--scaling") == 0) {
-      scaling = true;
+    const std::string_view argument = argv[i];
+    if (argument.starts_with("--factor=")) {
+      factor = argv[i] + 9;
+    } else if (argument.starts_with("--limit=")) {
+      if (!readNumber(argv[i] + 8, 1e6, options.measured.limit)) return std::nullopt;
+    } else if (argument.starts_with("--ideas=")) {
+      options.measured.ideas = argument.substr(8);
+    } else if (argument == "--scaling") {
+      options.scaling = true;
+    } else if (argument == "--phrasings") {
+      options.phrasings = true;
     } else {
       argv[kept++] = argv[i];
     }
   }
   argc = kept;
-  if (!text || !*text) return 0.1;
-  char* end = nullptr;
-  const double factor = std::strtod(text, &end);
-  if (*end || !(factor > 0 && factor <= 15)) return std::nullopt;
-  return factor;
+  if (factor && *factor && !readNumber(factor, 15, options.measured.factor)) return std::nullopt;
+  return options;
 }
 
 }  // namespace
@@ -262,16 +275,16 @@ int main(int argc, char** argv) {
   if (argc == 3 && std::strcmp(argv[1], "--peak") == 0) return bench::reportPeak(argv[2]);
   if (argc == 2 && std::strcmp(argv[1], "--functions") == 0) return bench::reportFunctions();
   if (argc == 2 && std::strcmp(argv[1], "--threads") == 0) return bench::reportThreads();
-  bool scaling = false;
-  const std::optional<double> factor = takeFactor(argc, argv, scaling);
-  if (!factor) {
-    std::fprintf(stderr, "the factor must be above 0 and at most 15\n");
+  const std::optional<Options> options = takeOptions(argc, argv);
+  if (!options) {
+    std::fprintf(stderr, "the factor must be above 0 and at most 15, the limit above 0\n");
     return 2;
   }
-  if (scaling) return bench::reportScaling();
+  if (options->scaling) return bench::reportScaling();
+  if (options->phrasings) return bench::reportPhrasings(options->measured);
   benchmark::Initialize(&argc, argv);
   if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 2;
-  prepare(*factor);
+  prepare(options->measured.factor);
   registerAll();
   benchmark::RunSpecifiedBenchmarks();
   benchmark::Shutdown();

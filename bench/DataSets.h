@@ -5,6 +5,9 @@
 #include "BibliographyData.h"
 #include "BusinessData.h"
 
+#include <algorithm>
+#include <iterator>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 
@@ -20,5 +23,12 @@ inline constexpr DataSet dataSets[] = {
     {"bibliography", bibliographyData},
     {"business", businessData},
 };
+
+inline std::string generatedData(std::string_view name, double factor) {
+  const auto* set = std::find_if(std::begin(dataSets), std::end(dataSets),
+                                 [name](const DataSet& one) { return one.name == name; });
+  if (set == std::end(dataSets)) throw std::runtime_error("no such data: " + std::string(name));
+  return set->generate(factor);
+}
 
 }  // namespace bench

@@ -30,4 +30,18 @@ inline size_t evaluate(xquery::XQueryContext& context, const xquery::XQuery& que
   return items->count();
 }
 
+// The items as the command prints them, one on a line.
+inline std::string printed(const xquery::NSArray& items) {
+  std::string text;
+  for (const xquery::Value& item : items.objects()) {
+    if (const auto* node = xquery::dyn_cast<xquery::NSXMLNode>(item)) {
+      node->appendXMLTo(text);
+    } else {
+      text += xquery::XQueryItemStringValue(*item);
+    }
+    text += '\n';
+  }
+  return text;
+}
+
 }  // namespace bench

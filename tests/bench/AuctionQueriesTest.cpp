@@ -1,12 +1,13 @@
-// The twenty queries of bench/queries over a small document, against results that were worked out
-// by a program of its own, which reads the same document and knows nothing of the engine.
+// The twenty numbered ideas of bench/queries over a small document, each phrasing of them against
+// results that were worked out by a program of its own, which reads the same document and knows
+// nothing of the engine.
 #include "AuctionData.h"
-#include "xquery/xquery.h"
+#include "Engine.h"
+#include "Queries.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <filesystem>
 #include <fstream>
 #include <iterator>
 #include <string>
@@ -18,48 +19,42 @@ namespace {
 
 constexpr double factor = 0.004;
 
-std::string readFile(const std::filesystem::path& path) {
-  std::ifstream file(path, std::ios::binary);
-  return {std::istreambuf_iterator<char>(file), {}};
+const std::vector<bench::PhrasedQuery>& theTwenty() {
+  static const auto queries = [] {
+    auto all = bench::phrasedQueries(XQUERY_SOURCE_DIR "/bench/queries");
+    std::erase_if(all, [](const bench::PhrasedQuery& query) { return !query.isOfTheTwenty(); });
+    return all;
+  }();
+  return queries;
 }
 
-std::vector<std::string> queryNames() {
+std::vector<std::string> ideas() {
   std::vector<std::string> names;
-  for (const auto& entry :
-       std::filesystem::directory_iterator(XQUERY_SOURCE_DIR "/bench/queries")) {
-    if (entry.path().extension() == ".xq") names.push_back(entry.path().stem().string());
-  }
-  std::sort(names.begin(), names.end());
+  for (const auto& query : theTwenty()) names.push_back(query.idea);
+  names.erase(std::unique(names.begin(), names.end()), names.end());
   return names;
 }
 
-// One line per item, as the command prints it.
-std::string printed(const NSArray& items) {
-  std::string text;
-  for (const Value& item : items.objects()) {
-    if (const auto* node = dyn_cast<NSXMLNode>(item)) {
-      node->appendXMLTo(text);
-    } else {
-      text += XQueryItemStringValue(*item);
-    }
-    text += '\n';
-  }
-  return text;
+std::string expected(const std::string& idea) {
+  std::ifstream file(XQUERY_SOURCE_DIR "/tests/bench/auction/" + idea + ".expected",
+                     std::ios::binary);
+  return {std::istreambuf_iterator<char>(file), {}};
 }
 
 class AuctionQuery : public testing::TestWithParam<std::string> {};
 
-TEST_P(AuctionQuery, GivesTheExpectedResult) {
-  static const Ref<NSXMLDocument> document =
-      NSXMLDocument::documentWithData(bench::auctionData(factor), NSXMLNodePreserveWhitespace);
-  const auto query =
-      XQuery::xqueryWithSource(readFile(XQUERY_SOURCE_DIR "/bench/queries/" + GetParam() + ".xq"));
-  Ref<XQueryError> error;
-  const auto items =
-      XQueryContext::xqueryContext()->evaluateXQuery(*query, {}, Value(document.get()), &error);
-  ASSERT_TRUE(items) << (error ? error->description()->utf8() : "no value");
-  EXPECT_EQ(printed(*items),
-            readFile(XQUERY_SOURCE_DIR "/tests/bench/auction/" + GetParam() + ".expected"));
+TEST_P(AuctionQuery, GivesTheExpectedResultHoweverItIsPhrased) {
+  const Value document = bench::parse(bench::auctionData(factor));
+  for (const bench::PhrasedQuery& query : theTwenty()) {
+    if (query.idea != GetParam()) continue;
+    const auto compiled = bench::compile(query.text);
+    Ref<XQueryError> error;
+    const auto items =
+        XQueryContext::xqueryContext()->evaluateXQuery(*compiled, {}, document, &error);
+    ASSERT_TRUE(items) << query.phrasing << ": "
+                       << (error ? error->description()->utf8() : "no value");
+    EXPECT_EQ(bench::printed(*items), expected(query.idea)) << query.phrasing;
+  }
 }
 
 std::string testName(const testing::TestParamInfo<std::string>& parameter) {
@@ -68,10 +63,17 @@ std::string testName(const testing::TestParamInfo<std::string>& parameter) {
   return name;
 }
 
-INSTANTIATE_TEST_SUITE_P(All, AuctionQuery, testing::ValuesIn(queryNames()), testName);
+INSTANTIATE_TEST_SUITE_P(All, AuctionQuery, testing::ValuesIn(ideas()), testName);
 
 TEST(AuctionQueries, AreTwenty) {
-  EXPECT_EQ(queryNames().size(), 20U);
+  EXPECT_EQ(ideas().size(), 20U);
+}
+
+TEST(AuctionQueries, AllHaveAPlainPhrasing) {
+  const auto& queries = theTwenty();
+  EXPECT_EQ(std::count_if(queries.begin(), queries.end(),
+                          [](const auto& query) { return query.phrasing == "plain"; }),
+            20);
 }
 
 }  // namespace

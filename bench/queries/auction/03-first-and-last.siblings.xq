@@ -1,0 +1,6 @@
+(: The auctions whose last increase is at least twice the first one. :)
+for $auction in /site/open_auctions/open_auction
+let $first := $auction/bidder[empty(preceding-sibling::bidder)]/increase
+let $last := $auction/bidder[empty(following-sibling::bidder)]/increase
+where $first * 2 <= $last + 0
+return <increase first="{$first/text()}" last="{$last/text()}"/>

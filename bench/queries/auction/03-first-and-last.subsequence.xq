@@ -1,0 +1,6 @@
+(: The auctions whose last increase is at least twice the first one. :)
+for $auction in /site/open_auctions/open_auction
+let $first := subsequence($auction/bidder, 1, 1)/increase
+let $last := subsequence($auction/bidder, count($auction/bidder), 1)/increase
+where $first * 2 <= $last + 0
+return <increase first="{$first/text()}" last="{$last/text()}"/>

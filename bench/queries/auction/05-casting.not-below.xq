@@ -1,0 +1,2 @@
+(: How many items sold for 40 or more. :)
+count(/site/closed_auctions/closed_auction[not(price < 40)])

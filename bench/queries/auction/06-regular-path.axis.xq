@@ -1,0 +1,2 @@
+(: The number of items of all regions together. :)
+count(/site/regions/descendant::item)

@@ -1,0 +1,2 @@
+(: How many pieces of prose there are. :)
+count(//*[self::description or self::annotation or self::emailaddress])

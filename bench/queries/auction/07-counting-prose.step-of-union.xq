@@ -1,0 +1,2 @@
+(: How many pieces of prose there are. :)
+count(/site//(description | annotation | emailaddress))

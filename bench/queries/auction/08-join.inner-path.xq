@@ -1,0 +1,4 @@
+(: What every person bought, as a number. :)
+for $person in /site/people/person
+let $bought := /site/closed_auctions/closed_auction[buyer[@person = $person/@id]]
+return <item person="{$person/name/text()}">{count($bought)}</item>

@@ -1,0 +1,23 @@
+(: All persons by the category that they are interested in, with what is known of them. :)
+for $category in distinct-values(//interest/@category)
+let $members :=
+  for $person in /site/people/person
+  where some $interest in $person/profile/interest satisfies $interest/@category eq $category
+  return
+    <member>
+      <facts>
+        <sex>{$person/profile/gender/text()}</sex>
+        <age>{$person/profile/age/text()}</age>
+        <education>{$person/profile/education/text()}</education>
+        <income>{string($person/profile/@income)}</income>
+      </facts>
+      <contact>
+        <name>{$person/name/text()}</name>
+        <street>{$person/address/street/text()}</street>
+        <city>{$person/address/city/text()}</city>
+        <country>{$person/address/country/text()}</country>
+        <email>{$person/emailaddress/text()}</email>
+      </contact>
+      <card>{$person/creditcard/text()}</card>
+    </member>
+return <category><id>{$category}</id>{$members}</category>

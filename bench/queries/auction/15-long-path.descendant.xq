@@ -1,0 +1,3 @@
+(: The keywords emphasized deep in the annotations of closed auctions. :)
+for $keyword in /site/closed_auctions//description/parlist/listitem/parlist/listitem/text/emph
+return <text>{$keyword/text()}</text>

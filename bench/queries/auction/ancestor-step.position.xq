@@ -1,0 +1,2 @@
+(: How many keywords stand in lists within lists. :)
+count(//keyword[ancestor::listitem[2]])

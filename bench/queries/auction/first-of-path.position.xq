@@ -1,0 +1,2 @@
+(: The name of the first featured item. :)
+(/site/regions/*/item[@featured = "yes"])[position() = 1]/name/text()

@@ -1,0 +1,2 @@
+(: The name of the last featured item. :)
+(//item[@featured = "yes"])[last()]/name/text()

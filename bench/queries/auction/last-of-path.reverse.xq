@@ -1,0 +1,2 @@
+(: The name of the last featured item. :)
+reverse(//item[@featured = "yes"])[1]/name/text()

@@ -1,0 +1,2 @@
+(: How many elements below the regions are items. :)
+count(/site/regions/*/*:item)

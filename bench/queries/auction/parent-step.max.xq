@@ -1,0 +1,2 @@
+(: How many auctions have a bid of more than 35. :)
+count(//open_auction[max(bidder/increase) > 35])

@@ -1,0 +1,7 @@
+(: The items of one region, copied node by node. :)
+declare function local:copy($node) {
+  if ($node instance of element())
+  then element {name($node)} {$node/@*, for $child in $node/node() return local:copy($child)}
+  else $node
+};
+<region>{for $item in /site/regions/africa/item return local:copy($item)}</region>

@@ -1,0 +1,2 @@
+(: How many keywords stand in lists, by sets of nodes. :)
+count(//keyword[ancestor::listitem])

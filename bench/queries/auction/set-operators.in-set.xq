@@ -1,0 +1,3 @@
+(: How many keywords stand in lists, by sets of nodes. :)
+let $listed := //listitem//keyword
+return count(//keyword[exists(. intersect $listed)])

@@ -1,0 +1,2 @@
+(: How many items are described with a piece of a word. :)
+count(for $item in /site/regions/*/item where contains($item/description, "mihil") return $item)

@@ -1,0 +1,2 @@
+(: The names of items and persons. :)
+count(/site//(item | person)/name)

@@ -1,0 +1,3 @@
+(: Records all of whose authors give a home page. :)
+let $names := /bibliography/people/person[homepage]/name
+return count(/bibliography/records/*[empty(author[not(. = $names)])])

@@ -1,0 +1,2 @@
+(: Records whose first author comes after the last one in the alphabet. :)
+count(//records/*[author[1] > reverse(author)[1]])

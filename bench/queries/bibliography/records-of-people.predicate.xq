@@ -1,0 +1,5 @@
+(: How many records the people of one country have each. :)
+for $person in /bibliography/people/person[country = "Kenya"]
+return <person name="{$person/name}">{
+  count(/bibliography/records/*[author = $person/name])
+}</person>

@@ -1,0 +1,2 @@
+(: How many books nobody cites. :)
+count(//book) - count(//book[@key = distinct-values(//cite/@key)])

@@ -1,0 +1,2 @@
+(: How many books nobody cites. :)
+count(//book except //book[@key = //cite/@key])

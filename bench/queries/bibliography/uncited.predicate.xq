@@ -1,0 +1,2 @@
+(: How many books nobody cites. :)
+count(/bibliography/records/book[not(@key = //cite/@key)])

@@ -1,0 +1,4 @@
+(: Articles and books of the first person. :)
+let $name := /bibliography/people/person[1]/name
+return count(/bibliography/records/*[author = $name]
+             except /bibliography/records/(paper | thesis))

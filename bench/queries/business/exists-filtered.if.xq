@@ -1,0 +1,4 @@
+(: Whether a cancelled order has a line of nine pieces at a discount of a tenth. :)
+declare namespace o = "urn:example:orders";
+if (//o:order[@status = "cancelled"]/o:line[@quantity = 9 and @discount = 0.1])
+then true() else false()

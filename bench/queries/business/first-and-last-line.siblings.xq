@@ -1,0 +1,4 @@
+(: Orders whose last line has a higher price than the first. :)
+declare namespace o = "urn:example:orders";
+count(//o:order[number(o:line[empty(following-sibling::o:line)]/@price)
+                > number(o:line[empty(preceding-sibling::o:line)]/@price)])

@@ -1,0 +1,8 @@
+(: The orders of each year and status. :)
+declare namespace o = "urn:example:orders";
+for $year in distinct-values(for $order in //o:order return substring($order/@date, 1, 4)),
+    $status in distinct-values(//o:order/@status)
+let $members := for $order in //o:order
+                where $order/@status = $status and substring($order/@date, 1, 4) = $year
+                return $order
+return <orders in="{$year}" are="{$status}">{count($members)}</orders>

@@ -1,0 +1,2 @@
+(: How many elements are orders. :)
+count(//*:order)

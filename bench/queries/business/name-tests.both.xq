@@ -1,0 +1,2 @@
+(: How many elements are orders. :)
+count(//*[local-name() = "order" and string(namespace-uri(.)) = "urn:example:orders"])

@@ -1,0 +1,3 @@
+(: How many orders are of the year 2003. :)
+declare namespace o = "urn:example:orders";
+count(//o:order[@date >= "2003-01-01" and @date <= "2003-12-31"])

@@ -1,0 +1,5 @@
+(: Payments of the whole amount of shipped orders, by the number of the order. :)
+declare namespace o = "urn:example:orders";
+count(for $order in //o:order[@status = "shipped"], $payment in //o:payment
+      where data($order/@number) = data($payment/@order)
+      return $payment)

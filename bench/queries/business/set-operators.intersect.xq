@@ -1,0 +1,3 @@
+(: Open orders of more than five lines. :)
+declare namespace o = "urn:example:orders";
+count(//o:order[@status = "open"] intersect //o:order[count(o:line) > 5])

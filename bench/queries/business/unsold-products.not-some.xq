@@ -1,0 +1,6 @@
+(: How many products no line sells. :)
+declare namespace p = "urn:example:products";
+declare namespace o = "urn:example:orders";
+count(for $product in //p:product
+      where not(some $line in //o:line satisfies $line/@sku eq $product/@sku)
+      return $product)

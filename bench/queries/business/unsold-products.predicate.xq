@@ -1,0 +1,4 @@
+(: How many products no line sells. :)
+declare namespace p = "urn:example:products";
+declare namespace o = "urn:example:orders";
+count(//p:product[not(@sku = //o:line/@sku)])
