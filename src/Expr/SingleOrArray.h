@@ -57,6 +57,11 @@ class SingleOrArray {
       _array[index] = std::move(element);
     }
   }
+  template <class Visit>
+  void forEach(Visit visit) {
+    if (_value) visit(_value);
+    for (Ref<T>& element : _array) visit(element);
+  }
   void insertInArray(size_t index, Ref<T> element) {
     if (index > _array.size()) index = _array.size();
     _array.insert(_array.begin() + static_cast<std::ptrdiff_t>(index), std::move(element));

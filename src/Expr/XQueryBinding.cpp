@@ -1,5 +1,6 @@
 #include "Expr/XQueryBinding.h"
 
+#include "Expr/XQueryParts.h"
 #include "Prolog/XQueryProlog.h"
 #include "xquery/Collection.h"
 
@@ -13,6 +14,11 @@ int64_t XQueryDeclareLocalVariable(const Ref<NSString>& name, XQueryProlog& prol
 
 Value XQueryBindingExpr::computeValue(XQueryContext& context) const {
   return XQueryEvaluateOrEmpty(_expr.get(), context);
+}
+
+void XQueryBindingExpr::visitParts(XQueryPartVisitor& visitor) {
+  visitor.ownPart(_type.get(), XQueryRole::Type);
+  visitor.part(_expr, XQueryRole::Bound);
 }
 
 void XQueryBindingExpr::bindType(XQueryProlog& prolog) {

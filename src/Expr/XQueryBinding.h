@@ -23,6 +23,11 @@ int64_t XQueryDeclareLocalVariable(const Ref<NSString>& name, XQueryProlog& prol
 
 class XQueryBindingExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) {
+    return object.kind() == Kind::ForExpr || object.kind() == Kind::LetExpr ||
+           object.kind() == Kind::QuantifiedItem || object.kind() == Kind::CaseClause;
+  }
+
   // Null when the clause declares no type.
   XQueryTypeDeclaration* type() const { return _type.get(); }
   XQueryExpr* expr() const { return _expr.get(); }
@@ -31,11 +36,13 @@ class XQueryBindingExpr : public XQueryExpr {
 
   // The value that the variable takes, or what a case answers.
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   // `type` and `expr` may be null; `varName` may be null or empty.
-  XQueryBindingExpr(Ref<NSString> varName, Ref<XQueryTypeDeclaration> type, Ref<XQueryExpr> expr)
-      : XQueryExpr(Kind::OtherExpr),
+  XQueryBindingExpr(Kind kind, Ref<NSString> varName, Ref<XQueryTypeDeclaration> type,
+                    Ref<XQueryExpr> expr)
+      : XQueryExpr(kind),
         _varName(std::move(varName)),
         _type(std::move(type)),
         _expr(std::move(expr)) {}

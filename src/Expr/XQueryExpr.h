@@ -26,6 +26,7 @@
 namespace xquery {
 
 class XQueryContext;
+class XQueryPartVisitor;
 class XQueryProlog;
 
 class XQueryExpr : public NSCounted {
@@ -45,6 +46,8 @@ class XQueryExpr : public NSCounted {
   // What evaluateWithContext answers: to be defined, and called by nobody else, since it lets
   // exceptions out.
   virtual Value computeValue(XQueryContext& context) const = 0;
+  // Names the expressions that this one consists of, once it is bound: see XQueryParts.h.
+  virtual void visitParts(XQueryPartVisitor& visitor) = 0;
   // For diagnostics.
   virtual Ref<NSString> description() const;
 

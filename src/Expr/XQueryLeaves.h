@@ -25,6 +25,7 @@ class XQueryLiteral : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog&) override {}
   // The stored object itself, every time, or the calling thread's own copy.
   Value computeValue(XQueryContext&) const override { return _value.own(); }
+  void visitParts(XQueryPartVisitor&) override {}
   Ref<NSString> description() const override;
 
  protected:
@@ -47,6 +48,7 @@ class XQueryVariable : public XQueryExpr {
   int64_t varID() const { return _varID; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor&) override {}
 
  protected:
   explicit XQueryVariable(Ref<NSString> name)
@@ -70,6 +72,7 @@ class XQueryContextItem : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog&) override {}
   // Null when there is no focus.
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor&) override {}
 
  private:
   XQueryContextItem() : XQueryExpr(Kind::ContextItemExpr) {}
@@ -88,6 +91,7 @@ class XQueryQNameReference : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog&) override {}
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor&) override {}
   // The same for those who raise errors. Raises error 1 for a name that has no namespace even now.
   Ref<XQueryQName> qNameForContext(XQueryContext& context) const;
 

@@ -3,6 +3,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryParts.h"
 #include "Expr/XQuerySequence.h"
 #include "xquery/Collection.h"
 
@@ -39,6 +40,14 @@ Value XQueryExprList::computeValue(XQueryContext& context) const {
     results.add(std::move(value));
   }
   return results.value();
+}
+
+void XQueryExprList::visitParts(XQueryPartVisitor& visitor) {
+  _storage.forEach([&](Ref<XQueryExpr>& part) { visitor.part(part, XQueryRole::Element); });
+}
+
+void XQueryArgs::visitParts(XQueryPartVisitor& visitor) {
+  _storage.forEach([&](Ref<XQueryExpr>& part) { visitor.part(part, XQueryRole::Argument); });
 }
 
 Value XQueryArgs::computeValue(XQueryContext& context) const {

@@ -28,6 +28,7 @@ class XQueryExprList : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   explicit XQueryExprList(Kind kind = Kind::ExprList) : XQueryExpr(kind) {}
@@ -44,6 +45,7 @@ class XQueryArgs : public XQueryExprList {
 
   [[nodiscard]] static Ref<XQueryArgs> args() { return make<XQueryArgs>(); }
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryArgs() : XQueryExprList(Kind::Args) {}

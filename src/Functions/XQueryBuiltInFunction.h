@@ -4,6 +4,7 @@
 #pragma once
 
 #include "Prolog/XQueryModules.h"
+#include "Types/XQueryItemKinds.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Object.h"
 
@@ -27,44 +28,91 @@ class XQueryBuiltInFunction : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::BuiltInFunction; }
 
-  // What the analysis of expressions may count on.
-  enum Traits : uint8_t {
-    // The function answers equal values for the same arguments, fails alike, looks at nothing else
-    // and does nothing else. Holds for calls with at least one argument: without any, some of these
-    // functions take the context item.
-    ReadsArgumentsOnly = 1,
-    // It answers truth values and nothing else.
-    AnswersTruth = 2,
+  // What the analysis of expressions may count on, for every call that answers a value.
+  enum Traits : uint32_t {
+    // Looks at what lies outside the subtrees of the nodes it is given: what is around them.
+    LooksAround = 1 << 0,
+    // Looks at the context item; the second one when it is called with fewer arguments than it
+    // takes.
+    ReadsFocus = 1 << 1,
+    FocusByDefault = 1 << 2,
+    ReadsPosition = 1 << 3,
+    ReadsSize = 1 << 4,
+    // Looks at the static context, the zone or the clock, which stay what they are at one place of
+    // a query for all of an evaluation.
+    ReadsStatic = 1 << 5,
     // A call asks the host for a document, which the host can tell.
-    LoadsDocuments = 4,
+    LoadsDocuments = 1 << 6,
+    // Its answer may hold nodes that did not exist before.
+    MakesNodes = 1 << 7,
+    // The host hears of each call.
+    Traces = 1 << 8,
+    // Called again with the same arguments it may answer something else, or do more.
+    Unrepeatable = 1 << 9,
+    // With a number of arguments that it takes, each with a value, it always answers one.
+    NeverFails = 1 << 10,
+    // Of what it hands on of its first argument: items stay in their order; none is left out.
+    KeepsOrder = 1 << 11,
+    KeepsCount = 1 << 12,
+  };
+
+  // Kinds of an answer besides the plain ones: those of the first argument, of all arguments, and
+  // of what atomizing the first argument gives. The first two hand on the items themselves.
+  static constexpr XQueryItemKinds OfFirst = 1U << 29;
+  static constexpr XQueryItemKinds OfAll = 1U << 30;
+  static constexpr XQueryItemKinds AtomizedFirst = 1U << 31;
+  static constexpr uint8_t many = 255;
+  // Of which kinds the items of an answer are, and how many there are at least and at most.
+  struct Answer {
+    XQueryItemKinds kinds;
+    uint8_t least;
+    uint8_t most;
+  };
+  // Called with another number of them the function refuses.
+  struct Arguments {
+    uint8_t least;
+    uint8_t most;
+  };
+  struct Registration {
+    XQueryNamespaceID namespaceID;
+    std::string_view localName;
+    XQueryProcedure proc;
+    Arguments arguments;
+    Answer answer;
+    uint32_t traits = 0;
+
+    bool has(Traits trait) const { return (traits & trait) != 0; }
+    bool takes(size_t argumentCount) const {
+      return argumentCount >= arguments.least &&
+             (argumentCount <= arguments.most || arguments.most == many);
+    }
+    bool readsContextItem(size_t argumentCount) const;
+    // Whether a call answers equal values for the same arguments, fails alike, looks at nothing
+    // else and does nothing else.
+    bool readsArgumentsOnly(size_t argumentCount) const;
+    // Whether it answers truth values and nothing else.
+    bool answersTruth() const { return answer.kinds == XQueryItems::Boolean && answer.least == 1; }
   };
 
   [[nodiscard]] static Ref<XQueryBuiltInFunction> builtInFunctionWithProc(XQueryProcedure proc);
-  XQueryProcedure proc() const { return _proc; }
-  bool has(Traits trait) const { return (_traits & trait) != 0; }
+  XQueryProcedure proc() const { return _row.proc; }
+  const Registration& row() const { return _row; }
 
   // Null for a name that is not registered.
   static XQueryProcedure functionForQName(const Ref<XQueryQName>& qName);
   static const XQueryBuiltInFunction* entryForQName(const Ref<XQueryQName>& qName);
 
-  struct Registration {
-    XQueryNamespaceID namespaceID;
-    std::string_view localName;
-    XQueryProcedure proc;
-    uint8_t traits = 0;
-  };
   // Every built-in function, in the order of registration.
   static std::span<const Registration> registrations();
 
  protected:
-  explicit XQueryBuiltInFunction(XQueryProcedure initWithProc, uint8_t traits = 0)
-      : NSCounted(Kind::BuiltInFunction), _proc(initWithProc), _traits(traits) {}
+  explicit XQueryBuiltInFunction(const Registration& row)
+      : NSCounted(Kind::BuiltInFunction), _row(row) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
-  XQueryProcedure _proc;
-  uint8_t _traits;
+  Registration _row;
 };
 
 }  // namespace xquery

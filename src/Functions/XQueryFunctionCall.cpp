@@ -2,6 +2,7 @@
 
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
+#include "Expr/XQueryParts.h"
 #include "Expr/XQuerySequence.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
@@ -62,16 +63,20 @@ Ref<XQueryFunctionCall> XQueryFunctionCall::functionCallWithName(Ref<NSString> n
 void XQueryFunctionCall::bindInfoForProlog(XQueryProlog& prolog) {
   if (const auto qName = prolog.functionQNameFromString(_name)) {
     if (const auto* entry = XQueryBuiltInFunction::entryForQName(qName)) {
+      _builtIn = entry;
       _function = entry->proc();
-      using Function = XQueryBuiltInFunction;
-      _readsArgumentsOnly = entry->has(Function::ReadsArgumentsOnly) && argumentCount() > 0;
-      _loadsDocuments = entry->has(Function::LoadsDocuments);
-      _answersTruth = entry->has(Function::AnswersTruth);
+      _readsArgumentsOnly = entry->row().readsArgumentsOnly(argumentCount());
+      _loadsDocuments = entry->row().has(XQueryBuiltInFunction::LoadsDocuments);
+      _answersTruth = entry->row().answersTruth();
     }
     if (!_function) _functionDecl = prolog.functionInfoForSignature({qName, argumentCount()});
   }
   if (!_function) prolog.countAdopter();
   if (_args) _args->bindInfoForProlog(prolog);
+}
+
+void XQueryFunctionCall::visitParts(XQueryPartVisitor& visitor) {
+  visitor.ownPart(_args.get(), XQueryRole::Arguments);
 }
 
 Value XQueryFunctionCall::computeValue(XQueryContext& context) const {

@@ -19,6 +19,8 @@ class XQueryFunctionCall : public XQueryCallExpr {
   const Ref<NSString>& name() const { return _name; }
   // What binding found: a procedure, a declaration (owned by its prolog), or neither.
   XQueryProcedure function() const { return _function; }
+  // The entry of the procedure in the registry; null for a function that is not built in.
+  const XQueryBuiltInFunction* builtIn() const { return _builtIn; }
   XQueryFunctionDecl* functionDecl() const { return _functionDecl; }
 
   // A built-in function wins over a declared one of the same name, whatever the number of
@@ -32,6 +34,7 @@ class XQueryFunctionCall : public XQueryCallExpr {
   //   error 17  invalid arguments to function - ...    the built-in function refused its arguments
   // An error that the function answers is one of the call.
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryFunctionCall(Ref<NSString> name, Ref<XQueryArgs> args)
@@ -54,6 +57,7 @@ class XQueryFunctionCall : public XQueryCallExpr {
 
   Ref<NSString> _name;
   XQueryProcedure _function = nullptr;
+  const XQueryBuiltInFunction* _builtIn = nullptr;
   XQueryFunctionDecl* _functionDecl = nullptr;
 };
 

@@ -10,6 +10,7 @@
 #include "Types/XQueryQName.h"
 #include "xquery/String.h"
 
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -28,6 +29,8 @@ class XQueryVarDecl : public NSCounted {
   const Ref<XQueryQName>& name() const { return _name; }
   XQueryTypeDeclaration* type() const { return _type.get(); }
   XQueryExpr* expr() const { return _expr.get(); }
+  // One that answers the same.
+  void setExpr(Ref<XQueryExpr> expr) { _expr = std::move(expr); }
   XQueryProlog& prolog() const { return _prolog; }
   bool isExternal() const { return !_expr; }
 
@@ -62,6 +65,8 @@ class XQueryParam : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog& prolog) override;
   // NSNull: a parameter is not evaluated for a value.
   Value computeValue(XQueryContext& context) const override;
+  // None: what is declared of a parameter is part of no expression.
+  void visitParts(XQueryPartVisitor&) override {}
 
  protected:
   XQueryParam(Ref<NSString> name, Ref<XQueryTypeDeclaration> type);
@@ -87,6 +92,8 @@ class XQueryFunctionDecl : public NSCounted {
   XQueryTypeDeclaration* type() const { return _type.get(); }
   const std::vector<Ref<XQueryParam>>& params() const { return _params; }
   XQueryExpr* expr() const { return _expr.get(); }
+  // One that answers the same.
+  void setExpr(Ref<XQueryExpr> expr) { _expr = std::move(expr); }
   XQueryProlog& prolog() const { return _prolog; }
   bool isExternal() const { return !_expr; }
 

@@ -17,6 +17,7 @@ class Initializer : public XQueryExpr {
   using Work = std::function<Value(XQueryContextInternal&)>;
   explicit Initializer(Work work) : XQueryExpr(Kind::OtherExpr), _work(std::move(work)) {}
   void bindInfoForProlog(XQueryProlog&) override {}
+  void visitParts(XQueryPartVisitor&) override {}
   Value computeValue(XQueryContext& context) const override { return _work(context._internal()); }
 
  private:

@@ -29,6 +29,7 @@ class Body : public XQueryExpr {
   explicit Body(std::function<Value(XQueryContextInternal&)> work)
       : XQueryExpr(Kind::OtherExpr), _work(std::move(work)) {}
   void bindInfoForProlog(XQueryProlog&) override {}
+  void visitParts(XQueryPartVisitor&) override {}
   Value computeValue(XQueryContext& context) const override { return _work(context._internal()); }
 
  private:

@@ -21,6 +21,7 @@ class ProbeExpr : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog& prolog) override {
     if (_bind) _bind(prolog);
   }
+  void visitParts(XQueryPartVisitor&) override {}
   Value computeValue(XQueryContext& context) const override { return _evaluate(context); }
 
  private:

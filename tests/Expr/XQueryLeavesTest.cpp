@@ -38,6 +38,7 @@ class BindNote : public XQueryExpr {
   explicit BindNote(std::function<void()> onBind)
       : XQueryExpr(Kind::OtherExpr), _onBind(std::move(onBind)) {}
   void bindInfoForProlog(XQueryProlog&) override { _onBind(); }
+  void visitParts(XQueryPartVisitor&) override {}
   Value computeValue(XQueryContext&) const override { return NSNull::null(); }
 
  private:

@@ -186,7 +186,7 @@ TEST(Traits, WhatAnswersTruthAnswersNothingElse) {
   const auto context = XQueryContext::xqueryContext();
   context->_internal().setContextItem(functiontest::elementFrom("<a xml:lang='a'/>"), 1);
   for (const auto& row : XQueryBuiltInFunction::registrations()) {
-    if (!(row.traits & XQueryBuiltInFunction::AnswersTruth)) continue;
+    if (!row.answersTruth()) continue;
     bool isAnswered = false;
     for (size_t count = 0; count <= 3; ++count) {
       for (const auto& arguments : sampleArguments(count)) {
@@ -215,9 +215,9 @@ TEST(Traits, WhatReadsItsArgumentsOnlyAnswersAlikeEverywhere) {
   };
   std::set<std::string> differing;
   for (const auto& row : XQueryBuiltInFunction::registrations()) {
-    const bool readsOnly = (row.traits & XQueryBuiltInFunction::ReadsArgumentsOnly) != 0;
-    if (!readsOnly && row.namespaceID == XQueryNamespaceExt) continue;
     for (size_t count = 1; count <= 3; ++count) {
+      const bool readsOnly = row.readsArgumentsOnly(count);
+      if (!readsOnly && row.namespaceID == XQueryNamespaceExt) continue;
       for (const auto& arguments : sampleArguments(count)) {
         if (shown(answered(row.proc, arguments, *here)) ==
             shown(answered(row.proc, arguments, *there))) {
@@ -233,7 +233,7 @@ TEST(Traits, WhatReadsItsArgumentsOnlyAnswersAlikeEverywhere) {
 
 TEST(Traits, OneFunctionAsksForDocuments) {
   for (const auto& row : XQueryBuiltInFunction::registrations()) {
-    EXPECT_EQ((row.traits & XQueryBuiltInFunction::LoadsDocuments) != 0,
+    EXPECT_EQ(row.has(XQueryBuiltInFunction::LoadsDocuments),
               row.proc == procedureNamed("doc", standardURI))
         << row.localName;
   }

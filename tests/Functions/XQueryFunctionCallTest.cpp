@@ -23,6 +23,7 @@ class ActingExpr : public XQueryExpr {
   using Act = std::function<Value(XQueryContext&)>;
   explicit ActingExpr(Act act) : XQueryExpr(Kind::OtherExpr), _act(std::move(act)) {}
   void bindInfoForProlog(XQueryProlog&) override { ++boundTimes; }
+  void visitParts(XQueryPartVisitor&) override {}
   Value computeValue(XQueryContext& context) const override { return _act(context); }
   int boundTimes = 0;
 

@@ -29,6 +29,7 @@ class ProbeExpr : public XQueryExpr {
   explicit ProbeExpr(std::function<void(XQueryProlog&)> onBind)
       : XQueryExpr(Kind::OtherExpr), _onBind(std::move(onBind)) {}
   void bindInfoForProlog(XQueryProlog& prolog) override { _onBind(prolog); }
+  void visitParts(XQueryPartVisitor&) override {}
   Value computeValue(XQueryContext&) const override { return NSNull::null(); }
 
  private:

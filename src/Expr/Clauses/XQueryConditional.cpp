@@ -3,6 +3,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryBinding.h"
+#include "Expr/XQueryParts.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 
@@ -19,6 +20,12 @@ void XQueryConditionalExpr::bindInfoForProlog(XQueryProlog& prolog) {
   for (const auto& expr : {_test, _then, _else}) {
     if (expr) expr->bindInfoForProlog(prolog);
   }
+}
+
+void XQueryConditionalExpr::visitParts(XQueryPartVisitor& visitor) {
+  visitor.part(_test, XQueryRole::Test);
+  visitor.part(_then, XQueryRole::Branch);
+  visitor.part(_else, XQueryRole::Branch);
 }
 
 Value XQueryConditionalExpr::computeValue(XQueryContext& context) const {

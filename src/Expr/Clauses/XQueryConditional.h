@@ -9,6 +9,8 @@ namespace xquery {
 
 class XQueryConditionalExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::ConditionalExpr; }
+
   // A missing branch is null and stands for the empty sequence. The misspelling belongs to the
   // name.
   [[nodiscard]] static Ref<XQueryConditionalExpr> condionalExpr(Ref<XQueryExpr> test,
@@ -17,11 +19,12 @@ class XQueryConditionalExpr : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryConditionalExpr(Ref<XQueryExpr> intWithTestExpr, Ref<XQueryExpr> thenExpr,
                         Ref<XQueryExpr> elseExpr)
-      : XQueryExpr(Kind::OtherExpr),
+      : XQueryExpr(Kind::ConditionalExpr),
         _test(std::move(intWithTestExpr)),
         _then(std::move(thenExpr)),
         _else(std::move(elseExpr)) {}

@@ -4,6 +4,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryClauseItems.h"
 #include "Expr/Clauses/XQueryFLWORSort.h"
+#include "Expr/XQueryParts.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryAtomization.h"
@@ -24,10 +25,8 @@ struct XQueryFLWORResults {
 
 XQueryForExpr::XQueryForExpr(Ref<NSString> name, Ref<XQueryTypeDeclaration> type,
                              Ref<NSString> position, Ref<XQueryExpr> expr)
-    : XQueryBindingExpr(std::move(name), std::move(type), std::move(expr)),
-      _posVarName(std::move(position)) {
-  _kind = Kind::ForExpr;
-}
+    : XQueryBindingExpr(Kind::ForExpr, std::move(name), std::move(type), std::move(expr)),
+      _posVarName(std::move(position)) {}
 
 Ref<XQueryForExpr> XQueryForExpr::exprWithName(Ref<NSString> name, Ref<XQueryTypeDeclaration> type,
                                                Ref<NSString> position, Ref<XQueryExpr> expr) {
@@ -46,7 +45,7 @@ void XQueryForExpr::bindInfoForProlog(XQueryProlog& prolog) {
 
 Ref<XQueryLetExpr> XQueryLetExpr::exprWithName(Ref<NSString> name, Ref<XQueryTypeDeclaration> type,
                                                Ref<XQueryExpr> expr) {
-  return make<XQueryLetExpr>(std::move(name), std::move(type), std::move(expr));
+  return make<XQueryLetExpr>(Kind::LetExpr, std::move(name), std::move(type), std::move(expr));
 }
 
 void XQueryLetExpr::bindInfoForProlog(XQueryProlog& prolog) {
@@ -57,7 +56,7 @@ void XQueryLetExpr::bindInfoForProlog(XQueryProlog& prolog) {
 
 XQueryOrderSpec::XQueryOrderSpec(Ref<XQueryExpr> expr, bool ascending, EmptyOrder emptyOrder,
                                  Ref<NSString> collation)
-    : XQueryExpr(Kind::OtherExpr),
+    : XQueryExpr(Kind::OrderSpec),
       _expr(std::move(expr)),
       _ascending(ascending),
       _emptyOrder(emptyOrder),
@@ -79,11 +78,15 @@ Value XQueryOrderSpec::computeValue(XQueryContext& context) const {
   return XQueryEvaluateOrEmpty(_expr.get(), context);
 }
 
+void XQueryOrderSpec::visitParts(XQueryPartVisitor& visitor) {
+  visitor.part(_expr, XQueryRole::OrderKey);
+}
+
 // --- the expression ------------------------------------------------------------------------------
 
 XQueryFLWORExpr::XQueryFLWORExpr(Clauses forLet, Ref<XQueryExpr> whereExpr, OrderSpecs orderSpecs,
                                  Ref<XQueryExpr> returnExpr)
-    : XQueryExpr(Kind::OtherExpr),
+    : XQueryExpr(Kind::FLWORExpr),
       _forLet(std::move(forLet)),
       _whereExpr(std::move(whereExpr)),
       _orderSpecs(std::move(orderSpecs)),
@@ -107,6 +110,13 @@ void XQueryFLWORExpr::bindInfoForProlog(XQueryProlog& prolog) {
   prolog.restoreLocalScope(scope);
   const auto* last = _forLet.empty() ? nullptr : dyn_cast<XQueryForExpr>(_forLet.back().get());
   _join = last ? XQueryForJoin::joinOf(*last, _whereExpr.get()) : nullptr;
+}
+
+void XQueryFLWORExpr::visitParts(XQueryPartVisitor& visitor) {
+  for (const auto& clause : _forLet) visitor.ownPart(clause.get(), XQueryRole::Clause);
+  visitor.part(_whereExpr, XQueryRole::Where);
+  for (const auto& spec : _orderSpecs) visitor.ownPart(spec.get(), XQueryRole::Clause);
+  visitor.part(_returnExpr, XQueryRole::Return);
 }
 
 bool XQueryFLWORExpr::isOfType(const XQueryBindingExpr& clause, const NSObject* value,
@@ -254,6 +264,10 @@ Ref<XQueryOrderExpr> XQueryOrderExpr::orderExpr(Ref<XQueryExpr> expr, bool order
 
 void XQueryOrderExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (_expr && XQueryCheckStack(prolog)) _expr->bindInfoForProlog(prolog);
+}
+
+void XQueryOrderExpr::visitParts(XQueryPartVisitor& visitor) {
+  visitor.part(_expr, XQueryRole::Element);
 }
 
 Value XQueryOrderExpr::computeValue(XQueryContext& context) const {

@@ -42,6 +42,8 @@ class XQueryForExpr : public XQueryBindingExpr {
 
 class XQueryLetExpr : public XQueryBindingExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::LetExpr; }
+
   [[nodiscard]] static Ref<XQueryLetExpr> exprWithName(Ref<NSString> name,
                                                        Ref<XQueryTypeDeclaration> type,
                                                        Ref<XQueryExpr> expr);
@@ -56,6 +58,8 @@ class XQueryLetExpr : public XQueryBindingExpr {
 // One key of an order by clause.
 class XQueryOrderSpec : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::OrderSpec; }
+
   enum EmptyOrder : int { EmptyUnspecified, EmptyLeast, EmptyGreatest };
 
   // An unspecified empty order takes the prolog's when the query is bound. The collation may be
@@ -71,6 +75,7 @@ class XQueryOrderSpec : public XQueryExpr {
   const Ref<NSString>& collation() const { return _collation; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryOrderSpec(Ref<XQueryExpr> expr, bool ascending, EmptyOrder emptyOrder,
@@ -89,6 +94,8 @@ class XQueryOrderSpec : public XQueryExpr {
 // result item is kept together with the keys of its tuple and everything is sorted once at the end.
 class XQueryFLWORExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::FLWORExpr; }
+
   using Clauses = std::vector<Ref<XQueryBindingExpr>>;  // XQueryForExpr and XQueryLetExpr
   using OrderSpecs = std::vector<Ref<XQueryOrderSpec>>;
 
@@ -98,9 +105,13 @@ class XQueryFLWORExpr : public XQueryExpr {
                                                            OrderSpecs orderSpecs,
                                                            Ref<XQueryExpr> returnExpr);
 
+  const Clauses& forLet() const { return _forLet; }
+  // Null without one.
+  const XQueryExpr* whereExpr() const { return _whereExpr.get(); }
   const OrderSpecs& orderSpecs() const { return _orderSpecs; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryFLWORExpr(Clauses forLet, Ref<XQueryExpr> whereExpr, OrderSpecs orderSpecs,
@@ -135,15 +146,19 @@ class XQueryFLWORExpr : public XQueryExpr {
 // "ordered {...}" and "unordered {...}": the ordering mode for the extent of the operand.
 class XQueryOrderExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::OrderExpr; }
+
   // `expr` may be null: the empty sequence.
   [[nodiscard]] static Ref<XQueryOrderExpr> orderExpr(Ref<XQueryExpr> expr, bool ordered);
 
+  bool ordered() const { return _ordered; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryOrderExpr(Ref<XQueryExpr> expr, bool ordered)
-      : XQueryExpr(Kind::OtherExpr), _expr(std::move(expr)), _ordered(ordered) {}
+      : XQueryExpr(Kind::OrderExpr), _expr(std::move(expr)), _ordered(ordered) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 

@@ -3,6 +3,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryClauseItems.h"
+#include "Expr/XQueryParts.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 
@@ -10,7 +11,8 @@ namespace xquery {
 
 Ref<XQueryQuantifiedExprItem> XQueryQuantifiedExprItem::quantifiedExpr(
     Ref<XQueryExpr> expr, Ref<NSString> forVar, Ref<XQueryTypeDeclaration> type) {
-  return make<XQueryQuantifiedExprItem>(std::move(forVar), std::move(type), std::move(expr));
+  return make<XQueryQuantifiedExprItem>(Kind::QuantifiedItem, std::move(forVar), std::move(type),
+                                        std::move(expr));
 }
 
 void XQueryQuantifiedExprItem::bindInfoForProlog(XQueryProlog& prolog) {
@@ -20,7 +22,7 @@ void XQueryQuantifiedExprItem::bindInfoForProlog(XQueryProlog& prolog) {
 }
 
 XQueryQuantifiedExpr::XQueryQuantifiedExpr(Items items, Ref<XQueryExpr> satisfies, bool every)
-    : XQueryExpr(Kind::OtherExpr),
+    : XQueryExpr(Kind::QuantifiedExpr),
       _items(std::move(items)),
       _satisfies(std::move(satisfies)),
       _every(every) {}
@@ -38,6 +40,11 @@ void XQueryQuantifiedExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
   for (const auto& item : _items) item->bindInfoForProlog(prolog);
   if (_satisfies) _satisfies->bindInfoForProlog(prolog);
+}
+
+void XQueryQuantifiedExpr::visitParts(XQueryPartVisitor& visitor) {
+  for (const auto& item : _items) visitor.ownPart(item.get(), XQueryRole::Clause);
+  visitor.part(_satisfies, XQueryRole::Satisfies);
 }
 
 Value XQueryQuantifiedExpr::computeValue(XQueryContext& context) const {

@@ -11,6 +11,8 @@ namespace xquery {
 // One variable clause.
 class XQueryQuantifiedExprItem : public XQueryBindingExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::QuantifiedItem; }
+
   // `type` may be null.
   [[nodiscard]] static Ref<XQueryQuantifiedExprItem> quantifiedExpr(
       Ref<XQueryExpr> expr, Ref<NSString> forVar, Ref<XQueryTypeDeclaration> type);
@@ -24,6 +26,8 @@ class XQueryQuantifiedExprItem : public XQueryBindingExpr {
 
 class XQueryQuantifiedExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::QuantifiedExpr; }
+
   using Items = std::vector<Ref<XQueryQuantifiedExprItem>>;
 
   [[nodiscard]] static Ref<XQueryQuantifiedExpr> someExpr(Items items, Ref<XQueryExpr> satisfies);
@@ -32,6 +36,9 @@ class XQueryQuantifiedExpr : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog& prolog) override;
   // One of the shared truth values, or the error record of a binding of the wrong type.
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
+
+  const Items& items() const { return _items; }
 
  protected:
   XQueryQuantifiedExpr(Items items, Ref<XQueryExpr> satisfies, bool every);

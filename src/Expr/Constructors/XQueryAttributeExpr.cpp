@@ -6,6 +6,7 @@
 #include "Expr/Constructors/XQueryContent.h"
 #include "Expr/Constructors/XQueryContentText.h"
 #include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryParts.h"
 #include "Platform/Tree/Arena.h"
 #include "Prolog/XQueryModules.h"
 #include "Types/XQueryErrors.h"
@@ -44,6 +45,11 @@ void XQueryAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
   _name.bind(prolog, Kind::Attribute, exprLine());
   for (const auto& item : _items) item->bindInfoForProlog(prolog);
+}
+
+void XQueryAttributeExpr::visitParts(XQueryPartVisitor& visitor) {
+  _name.visitParts(visitor);
+  for (auto& item : _items) visitor.part(item, XQueryRole::Content);
 }
 
 Value XQueryAttributeExpr::computeValue(XQueryContext& context) const {
@@ -90,6 +96,11 @@ void XQueryComputedAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
   _name.bind(prolog, Kind::Attribute, exprLine());
   if (_value) _value->bindInfoForProlog(prolog);
+}
+
+void XQueryComputedAttributeExpr::visitParts(XQueryPartVisitor& visitor) {
+  _name.visitParts(visitor);
+  visitor.part(_value, XQueryRole::Content);
 }
 
 Value XQueryComputedAttributeExpr::computeValue(XQueryContext& context) const {

@@ -28,6 +28,7 @@ class XQueryAttributeExpr : public XQueryExpr {
   size_t expectedTextLength() const;
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryAttributeExpr(const Ref<NSString>& name, std::vector<Ref<XQueryExpr>> items,
@@ -50,16 +51,21 @@ class XQueryAttributeExpr : public XQueryExpr {
 // attribute {...} {...}
 class XQueryComputedAttributeExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) {
+    return object.kind() == Kind::ComputedAttributeExpr;
+  }
+
   // `value` may be null.
   [[nodiscard]] static Ref<XQueryComputedAttributeExpr> computedAttributeExprWithName(
       Ref<XQueryExpr> name, Ref<XQueryExpr> value);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryComputedAttributeExpr(Ref<XQueryExpr> name, Ref<XQueryExpr> value)
-      : XQueryExpr(Kind::OtherExpr), _name(std::move(name)), _value(std::move(value)) {}
+      : XQueryExpr(Kind::ComputedAttributeExpr), _name(std::move(name)), _value(std::move(value)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 

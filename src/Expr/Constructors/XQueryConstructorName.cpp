@@ -2,6 +2,7 @@
 
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryParts.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/NameCharacters.h"
 #include "Types/XQueryAtomization.h"
@@ -81,6 +82,14 @@ void XQueryConstructorName::bind(XQueryProlog& prolog, Kind nodeKind, int64_t li
     _constant = nodeName(*qName);
   } else {
     bindUnresolved(prolog, line);
+  }
+}
+
+void XQueryConstructorName::visitParts(XQueryPartVisitor& visitor) {
+  if (_name) {
+    visitor.ownPart(_nameExpr.get(), XQueryRole::Name);
+  } else {
+    visitor.part(_nameExpr, XQueryRole::Name);
   }
 }
 

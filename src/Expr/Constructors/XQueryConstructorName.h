@@ -25,6 +25,9 @@ class XQueryConstructorName {
   // context's namespaces elsewhere.
   void bind(XQueryProlog& prolog, Kind nodeKind, int64_t line);
 
+  // The expression, unless the name is a constant.
+  void visitParts(XQueryPartVisitor& visitor);
+
   // Null when the expression has failed. Raises error 1 for a name that has no namespace even now,
   // error 6 for a value that is no name of a node.
   NSXMLNameRef evaluate(XQueryContext& context, int64_t line) const;

@@ -10,6 +10,7 @@
 #include "Expr/Constructors/XQueryInScopeNamespaces.h"
 #include "Expr/Constructors/XQueryNodeExprs.h"
 #include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryParts.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/Credit.h"
 #include "Prolog/XQueryProlog.h"
@@ -91,6 +92,12 @@ void XQueryElementExpr::bindInfoForProlog(XQueryProlog& prolog) {
   for (const auto& item : _items) item->bindInfoForProlog(prolog);
   _roomBytes = roomBytes();
   if (!_namespaces.empty()) prolog.popInScopeNamespaces();
+}
+
+void XQueryElementExpr::visitParts(XQueryPartVisitor& visitor) {
+  _name.visitParts(visitor);
+  for (const auto& attribute : _attributes) visitor.ownPart(attribute.get(), XQueryRole::Content);
+  for (auto& item : _items) visitor.part(item, XQueryRole::Content);
 }
 
 Value XQueryElementExpr::computeValue(XQueryContext& context) const {

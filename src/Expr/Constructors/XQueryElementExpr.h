@@ -24,6 +24,7 @@ class XQueryElementExpr : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryElementExpr(XQueryConstructorName name, Exprs attributes, Exprs items)

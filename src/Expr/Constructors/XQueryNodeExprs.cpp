@@ -5,6 +5,7 @@
 #include "Expr/Constructors/XQueryContent.h"
 #include "Expr/Constructors/XQueryContentText.h"
 #include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryParts.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNodeFunctions.h"
@@ -35,10 +36,14 @@ void XQueryValueConstructor::bindInfoForProlog(XQueryProlog& prolog) {
   bindPart(_value, prolog);
 }
 
+void XQueryValueConstructor::visitParts(XQueryPartVisitor& visitor) {
+  visitor.part(_value, XQueryRole::Content);
+}
+
 // --- text ----------------------------------------------------------------------------------------
 
 Ref<XQueryTextExpr> XQueryTextExpr::textExprWithValue(Ref<XQueryExpr> value) {
-  return make<XQueryTextExpr>(std::move(value));
+  return make<XQueryTextExpr>(Kind::TextExpr, std::move(value));
 }
 
 Value XQueryTextExpr::computeValue(XQueryContext& context) const {
@@ -57,7 +62,7 @@ Value XQueryTextExpr::computeValue(XQueryContext& context) const {
 // --- comments ------------------------------------------------------------------------------------
 
 Ref<XQueryCommentExpr> XQueryCommentExpr::commentExprWithValue(Ref<XQueryExpr> value) {
-  return make<XQueryCommentExpr>(std::move(value));
+  return make<XQueryCommentExpr>(Kind::CommentExpr, std::move(value));
 }
 
 Value XQueryCommentExpr::computeValue(XQueryContext& context) const {
@@ -79,6 +84,11 @@ void XQueryProcessingInstructionExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
   _name.bind(prolog, Kind::ProcessingInstruction, exprLine());
   bindPart(_value, prolog);
+}
+
+void XQueryProcessingInstructionExpr::visitParts(XQueryPartVisitor& visitor) {
+  _name.visitParts(visitor);
+  visitor.part(_value, XQueryRole::Content);
 }
 
 Value XQueryProcessingInstructionExpr::computeValue(XQueryContext& context) const {
@@ -104,7 +114,7 @@ Value XQueryProcessingInstructionExpr::computeValue(XQueryContext& context) cons
 // --- documents -----------------------------------------------------------------------------------
 
 Ref<XQueryDocumentExpr> XQueryDocumentExpr::documentWithExpr(Ref<XQueryExpr> expr) {
-  return make<XQueryDocumentExpr>(std::move(expr));
+  return make<XQueryDocumentExpr>(Kind::DocumentExpr, std::move(expr));
 }
 
 void XQueryDocumentExpr::bindInfoForProlog(XQueryProlog& prolog) {
@@ -140,6 +150,10 @@ Ref<NSXMLNode> XQueryNamespaceExpr::constantNode() const {
 
 void XQueryNamespaceExpr::bindInfoForProlog(XQueryProlog& prolog) {
   bindPart(_value, prolog);
+}
+
+void XQueryNamespaceExpr::visitParts(XQueryPartVisitor& visitor) {
+  visitor.part(_value, XQueryRole::Content);
 }
 
 Value XQueryNamespaceExpr::computeValue(XQueryContext& context) const {

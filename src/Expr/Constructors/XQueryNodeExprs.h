@@ -11,10 +11,11 @@ namespace xquery {
 class XQueryValueConstructor : public XQueryExpr {
  public:
   void bindInfoForProlog(XQueryProlog& prolog) override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
-  explicit XQueryValueConstructor(Ref<XQueryExpr> value)
-      : XQueryExpr(Kind::OtherExpr), _value(std::move(value)) {}
+  XQueryValueConstructor(Kind kind, Ref<XQueryExpr> value)
+      : XQueryExpr(kind), _value(std::move(value)) {}
 
   Ref<XQueryExpr> _value;
 };
@@ -22,6 +23,8 @@ class XQueryValueConstructor : public XQueryExpr {
 // text {...}: the empty sequence makes no node.
 class XQueryTextExpr : public XQueryValueConstructor {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::TextExpr; }
+
   [[nodiscard]] static Ref<XQueryTextExpr> textExprWithValue(Ref<XQueryExpr> value);
 
   Value computeValue(XQueryContext& context) const override;
@@ -35,6 +38,8 @@ class XQueryTextExpr : public XQueryValueConstructor {
 // comment {...}
 class XQueryCommentExpr : public XQueryValueConstructor {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::CommentExpr; }
+
   [[nodiscard]] static Ref<XQueryCommentExpr> commentExprWithValue(Ref<XQueryExpr> value);
 
   Value computeValue(XQueryContext& context) const override;
@@ -48,16 +53,23 @@ class XQueryCommentExpr : public XQueryValueConstructor {
 // processing-instruction {...} {...}, and the direct form.
 class XQueryProcessingInstructionExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) {
+    return object.kind() == Kind::ProcessingInstructionExpr;
+  }
+
   // `value` may be null.
   [[nodiscard]] static Ref<XQueryProcessingInstructionExpr> processingInstructionExprWithName(
       Ref<XQueryExpr> name, Ref<XQueryExpr> value);
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryProcessingInstructionExpr(Ref<XQueryExpr> name, Ref<XQueryExpr> value)
-      : XQueryExpr(Kind::OtherExpr), _name(std::move(name)), _value(std::move(value)) {}
+      : XQueryExpr(Kind::ProcessingInstructionExpr),
+        _name(std::move(name)),
+        _value(std::move(value)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
@@ -69,6 +81,8 @@ class XQueryProcessingInstructionExpr : public XQueryExpr {
 // document {...}
 class XQueryDocumentExpr : public XQueryValueConstructor {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::DocumentExpr; }
+
   [[nodiscard]] static Ref<XQueryDocumentExpr> documentWithExpr(Ref<XQueryExpr> expr);
   void bindInfoForProlog(XQueryProlog& prolog) override;
 
@@ -93,6 +107,7 @@ class XQueryNamespaceExpr : public XQueryExpr {
   Ref<NSXMLNode> constantNode() const;
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryNamespaceExpr(Ref<NSString> name, Ref<XQueryExpr> value)

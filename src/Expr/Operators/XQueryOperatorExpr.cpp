@@ -8,6 +8,7 @@
 #include "Expr/Operators/XQueryRange.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
+#include "Expr/XQueryParts.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/Collection.h"
@@ -153,6 +154,12 @@ void XQueryOperatorExpr::bindInfoForProlog(XQueryProlog& prolog) {
   for (size_t index = spine.count(); index-- > 0;) {
     spine[index]->_right->bindInfoForProlog(prolog);
   }
+}
+
+void XQueryOperatorExpr::visitParts(XQueryPartVisitor& visitor) {
+  const bool isLogical = operatorClassification(_type) == Logical;
+  visitor.part(_left, XQueryRole::Operand);
+  visitor.part(_right, isLogical ? XQueryRole::LaterOperand : XQueryRole::Operand);
 }
 
 Value XQueryOperatorExpr::computeValue(XQueryContext& context) const {

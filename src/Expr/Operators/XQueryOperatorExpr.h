@@ -70,6 +70,7 @@ class XQueryOperatorExpr : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
   // 1 logical, 2 arithmetic, 3 range, 4 sequence, 5 value, 6 general, 7 node comparison; else 0.
   static int operatorClassification(int type);

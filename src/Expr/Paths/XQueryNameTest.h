@@ -44,6 +44,7 @@ class XQueryNameTest : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor&) override {}
 
  protected:
   explicit XQueryNameTest(Ref<NSString> name)
@@ -77,6 +78,7 @@ class XQueryWildCardNameTest : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor&) override {}
 
  protected:
   XQueryWildCardNameTest(Ref<NSString> prefix, Ref<NSString> localName)

@@ -29,6 +29,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryAxisWalk.h"
 #include "Expr/Paths/XQueryPathRun.h"
+#include "Expr/XQueryParts.h"
 #include "Expr/XQueryReads.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
@@ -97,6 +98,23 @@ void XQueryStep::bindInfoForProlog(XQueryProlog& prolog) {
     predicate->bindInfoForProlog(prolog);
   }
   _mayAdopt = prolog.adopterCount() != adoptersBefore;
+}
+
+void XQueryStep::visitParts(XQueryPartVisitor& visitor, bool isFirst) {
+  visitor.step(*this);
+  if (isa<XQueryAxisStep>(this)) {
+    visitor.ownPart(_expr.get(), XQueryRole::NodeTest);
+  } else {
+    visitor.part(_expr, isFirst ? XQueryRole::FirstStep : XQueryRole::Step);
+  }
+  for (size_t index = 0; index < _predicates.size() && _predicates[index]; ++index) {
+    // A literal position is never evaluated.
+    if (literalPosition(index)) {
+      visitor.ownPart(_predicates[index].get(), XQueryRole::Predicate);
+    } else {
+      visitor.part(_predicates[index], XQueryRole::Predicate);
+    }
+  }
 }
 
 bool XQueryStep::hasRepeatablePredicates(bool variablesMayChange) const {
@@ -454,6 +472,12 @@ void XQueryPathExpr::findGatheringSteps() {
   }
   for (XQueryStep* step = _step.get(); last && step != last; step = step->next()) {
     if (auto* axisStep = dyn_cast<XQueryAxisStep>(step)) axisStep->_gathersFirst = true;
+  }
+}
+
+void XQueryPathExpr::visitParts(XQueryPartVisitor& visitor) {
+  for (XQueryStep* step = _step.get(); step; step = step->next()) {
+    step->visitParts(visitor, step == _step.get());
   }
 }
 

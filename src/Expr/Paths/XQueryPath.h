@@ -49,8 +49,12 @@ class XQueryStep : public NSCounted {
   void setLast(Ref<XQueryStep> last);
   const std::vector<Ref<XQueryExpr>>& predicates() const { return _predicates; }
   void setPredicates(std::vector<Ref<XQueryExpr>> predicates);
+  // Whether the predicate is a numeric literal, which is never evaluated: it asks for a position.
+  bool asksForPosition(size_t index) const { return literalPosition(index).has_value(); }
 
   virtual void bindInfoForProlog(XQueryProlog& prolog);
+  // The parts of the path that are this step's. `isFirst`: the path begins with it.
+  void visitParts(XQueryPartVisitor& visitor, bool isFirst);
   // Applies predicate `index` and those after it; null when a limit was reached. The misspelling
   // belongs to the name.
   Value handlePreicatesFromIndex(size_t index, Value items, XQueryContext& context) const;
@@ -195,6 +199,7 @@ class XQueryRootStepExpr : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog&) override {}
   // The document node above the context item.
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor&) override {}
 
  protected:
   XQueryRootStepExpr();
@@ -213,6 +218,7 @@ class XQueryPathExpr : public XQueryExpr {
   // The chain of steps does not change afterwards.
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   explicit XQueryPathExpr(Ref<XQueryStep> step)

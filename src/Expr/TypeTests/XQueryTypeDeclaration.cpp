@@ -2,6 +2,7 @@
 
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/XQueryParts.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
@@ -147,6 +148,10 @@ void XQueryTypeDeclaration::bindInfoForProlog(XQueryProlog& prolog) {
     if (_type == AttributeTest) nameTest->setAttribute(true);
     nameTest->bindInfoForProlog(prolog);
   }
+}
+
+void XQueryTypeDeclaration::visitParts(XQueryPartVisitor& visitor) {
+  visitor.ownPart(dyn_cast<XQueryExpr>(_data.get()), XQueryRole::NodeTest);
 }
 
 Value XQueryTypeDeclaration::computeValue(XQueryContext&) const {

@@ -52,6 +52,7 @@ class XQueryTypeDeclaration : public XQueryExpr {
   void setOccuranceType(int32_t occuranceType) { _occuranceType = occuranceType; }
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
+  void visitParts(XQueryPartVisitor& visitor) override;
   // A declaration is never evaluated for a value: NSNull.
   Value computeValue(XQueryContext& context) const override;
 

@@ -3,6 +3,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryBinding.h"
+#include "Expr/XQueryParts.h"
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/Number.h"
@@ -15,6 +16,11 @@ void XQueryTypedExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (_expr) _expr->bindInfoForProlog(prolog);
 }
 
+void XQueryTypedExpr::visitParts(XQueryPartVisitor& visitor) {
+  visitor.ownPart(_type.get(), XQueryRole::Type);
+  visitor.part(_expr, XQueryRole::Operand);
+}
+
 Value XQueryTypedExpr::operand(XQueryContext& context) const {
   XQueryCheckStack(context);
   return XQueryEvaluateOrEmpty(_expr.get(), context);
@@ -22,7 +28,7 @@ Value XQueryTypedExpr::operand(XQueryContext& context) const {
 
 Ref<XQueryInstanceOfExpr> XQueryInstanceOfExpr::instanceOfExpr(Ref<XQueryExpr> expr,
                                                                Ref<XQueryTypeDeclaration> forType) {
-  return make<XQueryInstanceOfExpr>(std::move(expr), std::move(forType));
+  return make<XQueryInstanceOfExpr>(Kind::InstanceOfExpr, std::move(expr), std::move(forType));
 }
 
 Value XQueryInstanceOfExpr::object(const Value& object, const XQueryTypeDeclaration& instanceOf,
@@ -38,7 +44,12 @@ Value XQueryInstanceOfExpr::computeValue(XQueryContext& context) const {
 
 Ref<XQueryTreatExpr> XQueryTreatExpr::treatExpr(Ref<XQueryExpr> expr,
                                                 Ref<XQueryTypeDeclaration> asType) {
-  return make<XQueryTreatExpr>(std::move(expr), std::move(asType));
+  return make<XQueryTreatExpr>(Kind::TreatExpr, std::move(expr), std::move(asType));
+}
+
+void XQueryTreatExpr::visitParts(XQueryPartVisitor& visitor) {
+  visitor.ownPart(_type.get(), XQueryRole::Type);
+  visitor.part(_expr, XQueryRole::Element);
 }
 
 Value XQueryTreatExpr::computeValue(XQueryContext& context) const {
@@ -49,7 +60,7 @@ Value XQueryTreatExpr::computeValue(XQueryContext& context) const {
 
 Ref<XQueryCastExpr> XQueryCastExpr::castExpr(Ref<XQueryExpr> expr,
                                              Ref<XQueryTypeDeclaration> asType) {
-  return make<XQueryCastExpr>(std::move(expr), std::move(asType));
+  return make<XQueryCastExpr>(Kind::CastExpr, std::move(expr), std::move(asType));
 }
 
 Value XQueryCastExpr::computeValue(XQueryContext& context) const {
@@ -66,7 +77,7 @@ Value XQueryCastExpr::computeValue(XQueryContext& context) const {
 
 Ref<XQueryCastableExpr> XQueryCastableExpr::castableExpr(Ref<XQueryExpr> expr,
                                                          Ref<XQueryTypeDeclaration> asType) {
-  return make<XQueryCastableExpr>(std::move(expr), std::move(asType));
+  return make<XQueryCastableExpr>(Kind::CastableExpr, std::move(expr), std::move(asType));
 }
 
 Value XQueryCastableExpr::computeValue(XQueryContext& context) const {

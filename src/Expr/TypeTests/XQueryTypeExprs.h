@@ -12,12 +12,18 @@ namespace xquery {
 // An operand and a declared type.
 class XQueryTypedExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) {
+    return object.kind() >= Kind::InstanceOfExpr && object.kind() <= Kind::CastableExpr;
+  }
+
   void bindInfoForProlog(XQueryProlog& prolog) override;
+  void visitParts(XQueryPartVisitor& visitor) override;
+  const XQueryTypeDeclaration& type() const { return *_type; }
 
  protected:
   // A null operand is the empty sequence.
-  XQueryTypedExpr(Ref<XQueryExpr> expr, Ref<XQueryTypeDeclaration> type)
-      : XQueryExpr(Kind::OtherExpr), _expr(std::move(expr)), _type(std::move(type)) {}
+  XQueryTypedExpr(Kind kind, Ref<XQueryExpr> expr, Ref<XQueryTypeDeclaration> type)
+      : XQueryExpr(kind), _expr(std::move(expr)), _type(std::move(type)) {}
   Value operand(XQueryContext& context) const;
 
   Ref<XQueryExpr> _expr;
@@ -26,6 +32,8 @@ class XQueryTypedExpr : public XQueryExpr {
 
 class XQueryInstanceOfExpr : public XQueryTypedExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::InstanceOfExpr; }
+
   [[nodiscard]] static Ref<XQueryInstanceOfExpr> instanceOfExpr(Ref<XQueryExpr> expr,
                                                                 Ref<XQueryTypeDeclaration> forType);
   // One of the shared truth values. `forContext` may be null.
@@ -41,6 +49,8 @@ class XQueryInstanceOfExpr : public XQueryTypedExpr {
 
 class XQueryTreatExpr : public XQueryTypedExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::TreatExpr; }
+
   [[nodiscard]] static Ref<XQueryTreatExpr> treatExpr(Ref<XQueryExpr> expr,
                                                       Ref<XQueryTypeDeclaration> asType);
   // The object itself when it matches; otherwise raises error 6 "invalid type".
@@ -49,6 +59,7 @@ class XQueryTreatExpr : public XQueryTypedExpr {
     return XQueryTreatAs(object, treatAs, forContext);
   }
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   using XQueryTypedExpr::XQueryTypedExpr;
@@ -58,6 +69,8 @@ class XQueryTreatExpr : public XQueryTypedExpr {
 
 class XQueryCastExpr : public XQueryTypedExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::CastExpr; }
+
   [[nodiscard]] static Ref<XQueryCastExpr> castExpr(Ref<XQueryExpr> expr,
                                                     Ref<XQueryTypeDeclaration> asType);
   // Atomizes, then casts: see XQueryCastObject.
@@ -75,6 +88,8 @@ class XQueryCastExpr : public XQueryTypedExpr {
 
 class XQueryCastableExpr : public XQueryTypedExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::CastableExpr; }
+
   [[nodiscard]] static Ref<XQueryCastableExpr> castableExpr(Ref<XQueryExpr> expr,
                                                             Ref<XQueryTypeDeclaration> asType);
   Value computeValue(XQueryContext& context) const override;

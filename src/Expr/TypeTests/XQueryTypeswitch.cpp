@@ -2,6 +2,7 @@
 
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
+#include "Expr/XQueryParts.h"
 #include "Types/XQueryErrors.h"
 
 namespace xquery {
@@ -9,7 +10,8 @@ namespace xquery {
 Ref<XQueryCaseClauseExpr> XQueryCaseClauseExpr::exprWithName(Ref<NSString> name,
                                                              Ref<XQueryTypeDeclaration> type,
                                                              Ref<XQueryExpr> expr) {
-  return make<XQueryCaseClauseExpr>(std::move(name), std::move(type), std::move(expr));
+  return make<XQueryCaseClauseExpr>(Kind::CaseClause, std::move(name), std::move(type),
+                                    std::move(expr));
 }
 
 void XQueryCaseClauseExpr::bindInfoForProlog(XQueryProlog& prolog) {
@@ -18,8 +20,15 @@ void XQueryCaseClauseExpr::bindInfoForProlog(XQueryProlog& prolog) {
   bindExpr(prolog);
 }
 
+void XQueryCaseClauseExpr::visitParts(XQueryPartVisitor& visitor) {
+  visitor.ownPart(_type.get(), XQueryRole::Type);
+  visitor.part(_expr, XQueryRole::Case);
+}
+
 XQueryTypeswitchExpr::XQueryTypeswitchExpr(Ref<XQueryExpr> expr, CaseClauses caseClauses)
-    : XQueryExpr(Kind::OtherExpr), _expr(std::move(expr)), _caseClauses(std::move(caseClauses)) {}
+    : XQueryExpr(Kind::TypeswitchExpr),
+      _expr(std::move(expr)),
+      _caseClauses(std::move(caseClauses)) {}
 
 Ref<XQueryTypeswitchExpr> XQueryTypeswitchExpr::expr(Ref<XQueryExpr> expr,
                                                      CaseClauses withCaseClauses) {
@@ -31,6 +40,11 @@ void XQueryTypeswitchExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
   if (_expr) _expr->bindInfoForProlog(prolog);
   for (const auto& clause : _caseClauses) clause->bindInfoForProlog(prolog);
+}
+
+void XQueryTypeswitchExpr::visitParts(XQueryPartVisitor& visitor) {
+  visitor.part(_expr, XQueryRole::Switched);
+  for (const auto& clause : _caseClauses) visitor.ownPart(clause.get(), XQueryRole::Clause);
 }
 
 // Null without clauses.

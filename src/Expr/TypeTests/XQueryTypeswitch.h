@@ -10,11 +10,14 @@ namespace xquery {
 
 class XQueryCaseClauseExpr : public XQueryBindingExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::CaseClause; }
+
   // `name` null or empty without a variable; `type` null for the default clause.
   [[nodiscard]] static Ref<XQueryCaseClauseExpr> exprWithName(Ref<NSString> name,
                                                               Ref<XQueryTypeDeclaration> type,
                                                               Ref<XQueryExpr> expr);
   void bindInfoForProlog(XQueryProlog& prolog) override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   using XQueryBindingExpr::XQueryBindingExpr;
@@ -24,6 +27,8 @@ class XQueryCaseClauseExpr : public XQueryBindingExpr {
 
 class XQueryTypeswitchExpr : public XQueryExpr {
  public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::TypeswitchExpr; }
+
   using CaseClauses = std::vector<Ref<XQueryCaseClauseExpr>>;
 
   // The last clause is the default.
@@ -32,6 +37,7 @@ class XQueryTypeswitchExpr : public XQueryExpr {
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
   XQueryTypeswitchExpr(Ref<XQueryExpr> expr, CaseClauses caseClauses);

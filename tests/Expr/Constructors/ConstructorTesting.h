@@ -30,6 +30,7 @@ class Constructors : public testing::Test {
    public:
     explicit Constant(Value value) : XQueryExpr(Kind::OtherExpr), _value(std::move(value)) {}
     void bindInfoForProlog(XQueryProlog&) override {}
+    void visitParts(XQueryPartVisitor&) override {}
     Value computeValue(XQueryContext&) const override { return _value; }
 
    private:

@@ -27,6 +27,7 @@ class Probe : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog&) override {
     if (_log) _log->push_back("bind " + _name);
   }
+  void visitParts(XQueryPartVisitor&) override {}
   Value computeValue(XQueryContext&) const override {
     ++evaluations;
     if (_log) _log->push_back(_name);
