@@ -15,6 +15,7 @@
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
+#include <cstdint>
 #include <map>
 #include <memory>
 #include <string>
@@ -31,6 +32,14 @@ class XQueryContext;
 // namespace. A name that does not resolve and a null value are passed over. Values are used as
 // given: a plain NSString, for example, is an xdt:untypedAtomic value.
 using XQueryConstants = std::map<std::string, Value>;
+
+// Whether a compiled query is planned, so that it is evaluated with less work, or evaluated step by
+// step as it is written. Nobody can tell the two apart but by the time they take; the plain way is
+// there to compare with.
+enum class XQueryWay : uint8_t {
+  Planned,  // unless the environment variable XQUERY_PLAN is "0" when the query is compiled
+  Plain,
+};
 
 // A compiled query. Errors found while compiling are kept in it.
 //
@@ -63,6 +72,9 @@ class XQUERY_EXPORT XQuery : public NSCounted {
   [[nodiscard]] static Ref<XQuery> xqueryWithSource(std::string_view source,
                                                     const XQueryLoading& loading,
                                                     const XQueryLimits& limits);
+  [[nodiscard]] static Ref<XQuery> xqueryWithSource(std::string_view source,
+                                                    const XQueryLoading& loading,
+                                                    const XQueryLimits& limits, XQueryWay way);
 
   // Null when the query compiled, else a new array of one XQueryError or more in the order found:
   // those of the parser, or, when it found none, those of the prolog and of names that do not

@@ -63,6 +63,10 @@ bool XQueryKeptValues::looksAway(const XQueryExpr& expr) {
   return false;
 }
 
+bool XQueryKeptValues::Entry::isFor(std::span<const Value> others) const {
+  return std::equal(dependencies.begin(), dependencies.end(), others.begin(), others.end());
+}
+
 uint64_t XQueryKeptValues::stamp() const {
   return _globalChanges + NSXMLTree::finishedChangeCount();
 }
@@ -71,10 +75,8 @@ XQueryKeptValues::Use XQueryKeptValues::use(const XQueryExpr& expr,
                                             std::span<const Value> dependencies, bool looksAround,
                                             std::shared_ptr<XQueryKeptValue>& kept) {
   Entry& entry = _entries[&expr];
-  auto& known = entry.dependencies;
-  if (entry.stamp != stamp() ||
-      !std::equal(known.begin(), known.end(), dependencies.begin(), dependencies.end())) {
-    known.assign(dependencies.begin(), dependencies.end());
+  if (entry.stamp != stamp() || !entry.isFor(dependencies)) {
+    entry.dependencies.assign(dependencies.begin(), dependencies.end());
     entry.stamp = stamp();
     entry.isDecided = false;
     entry.value = nullptr;
@@ -87,10 +89,27 @@ XQueryKeptValues::Use XQueryKeptValues::use(const XQueryExpr& expr,
   return entry.isDecided ? Use::Further : Use::Second;
 }
 
+XQueryKeptValues::Use XQueryKeptValues::useAtOnce(const XQueryExpr& expr,
+                                                  std::span<const Value> dependencies,
+                                                  bool looksAround,
+                                                  std::shared_ptr<XQueryKeptValue>& kept) {
+  const Use found = use(expr, dependencies, looksAround, kept);
+  if (found != Use::First) return found;
+  Entry& entry = _entries[&expr];
+  entry.isDecided = !XQueryAreSettled(dependencies, looksAround);
+  kept = nullptr;
+  return entry.isDecided ? Use::Further : Use::Second;
+}
+
 void XQueryKeptValues::keep(const XQueryExpr& expr, std::shared_ptr<XQueryKeptValue> value) {
   Entry& entry = _entries[&expr];
   entry.isDecided = true;
   entry.value = std::move(value);
+}
+
+void XQueryKeptValues::keep(const XQueryExpr& expr, std::span<const Value> dependencies,
+                            std::shared_ptr<XQueryKeptValue> value) {
+  if (_entries[&expr].isFor(dependencies)) keep(expr, std::move(value));
 }
 
 }  // namespace xquery

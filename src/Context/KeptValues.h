@@ -59,6 +59,14 @@ class XQueryKeptValues {
   // The dependencies are all that the expression reads, globals apart; they are kept alive.
   Use use(const XQueryExpr& expr, std::span<const Value> dependencies, bool looksAround,
           std::shared_ptr<XQueryKeptValue>& kept);
+  // The same where the expression is known to be evaluated often with the same dependencies: the
+  // value is to be made at the first use (Second), and First is never answered.
+  Use useAtOnce(const XQueryExpr& expr, std::span<const Value> dependencies, bool looksAround,
+                std::shared_ptr<XQueryKeptValue>& kept);
+  // Keeps what was made for these dependencies. Making it may have used the same expression for
+  // others, as a function does that calls itself: then nothing is kept.
+  void keep(const XQueryExpr& expr, std::span<const Value> dependencies,
+            std::shared_ptr<XQueryKeptValue> value);
   // A null value stands for: take the plain way as long as the dependencies are these.
   void keep(const XQueryExpr& expr, std::shared_ptr<XQueryKeptValue> value);
   void clear() { _entries.clear(); }
@@ -71,6 +79,8 @@ class XQueryKeptValues {
   uint64_t stamp() const;
 
   struct Entry {
+    bool isFor(std::span<const Value> others) const;
+
     uint64_t stamp = UINT64_MAX;  // no stamp
     std::vector<Value> dependencies;
     bool isDecided = false;

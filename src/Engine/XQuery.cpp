@@ -89,13 +89,18 @@ Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source, const XQueryLo
   }));
 }
 
-// Making a string of the text is part of the work.
 Ref<XQuery> XQuery::xqueryWithSource(std::string_view source, const XQueryLoading& loading,
                                      const XQueryLimits& limits) {
+  return xqueryWithSource(source, loading, limits, XQueryWay::Planned);
+}
+
+// Making a string of the text is part of the work.
+Ref<XQuery> XQuery::xqueryWithSource(std::string_view source, const XQueryLoading& loading,
+                                     const XQueryLimits& limits, XQueryWay way) {
   return make<XQuery>(compiled(limits, [&] {
     const auto text = NSString::stringWithUTF8(source);
     if (!text) return failed(XQueryErrors::notUTF8.error());
-    return std::make_unique<XQueryInternal>(text, loading);
+    return std::make_unique<XQueryInternal>(text, loading, way);
   }));
 }
 

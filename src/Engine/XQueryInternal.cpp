@@ -1,6 +1,7 @@
 #include "Engine/XQueryInternal.h"
 
 #include "Parser/XQueryParser.h"
+#include "Plan/Plan.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryParsedModule.h"
@@ -9,7 +10,8 @@
 
 namespace xquery {
 
-XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource, const XQueryLoading& loading) {
+XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource, const XQueryLoading& loading,
+                               XQueryWay way) {
   const auto parser = XQueryParser::parserWithSource(initWithSource);
   _errors = parser->errors();
   if (!_errors.empty()) return;
@@ -28,6 +30,8 @@ XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource, const XQuery
   _prolog->setNextLocalVariableID(1);
   if (_body) _body->bindInfoForProlog(*_prolog);
   _errors = _prolog->errors();
+  const bool isPlanned = way == XQueryWay::Planned && XQueryPlanIsEnabled();
+  if (_errors.empty() && isPlanned) _body = XQueryPlanned(*_prolog, _body);
 }
 
 XQueryInternal::XQueryInternal(Ref<XQueryError> error) : _errors{std::move(error)} {}

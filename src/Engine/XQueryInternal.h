@@ -5,6 +5,7 @@
 #include "xquery/Error.h"
 #include "xquery/Loading.h"
 #include "xquery/String.h"
+#include "xquery/XQuery.h"
 
 #include <vector>
 
@@ -15,7 +16,8 @@ class XQueryProlog;
 class XQueryInternal {
  public:
   // Compiles. Parse errors leave prolog and body null.
-  explicit XQueryInternal(const Ref<NSString>& initWithSource, const XQueryLoading& loading = {});
+  explicit XQueryInternal(const Ref<NSString>& initWithSource, const XQueryLoading& loading = {},
+                          XQueryWay way = XQueryWay::Planned);
   // A query that failed before it could be parsed.
   explicit XQueryInternal(Ref<XQueryError> error);
   // A query put together by hand, for the tests of the expression tree.

@@ -65,6 +65,34 @@ TEST(KeptValues, LooksNowAndThenOnlyAfterManyFirstUses) {
   EXPECT_EQ(text.back(), '+');
 }
 
+TEST(KeptValues, AreMadeAtTheFirstUseWhereThatIsAskedFor) {
+  XQueryKeptValues values;
+  const Ref<XQueryExpr> owner = XQueryLiteral::literalWithValue(integer(0));
+  const Value a = string("a");
+  const Value b = string("b");
+  std::string text;
+  for (const Value& dependency : {a, a, b, b, b, a}) {
+    std::shared_ptr<XQueryKeptValue> kept;
+    const auto use = values.useAtOnce(*owner, {&dependency, 1}, false, kept);
+    text += use == XQueryKeptValues::Use::First ? "1" : kept ? "+" : "-";
+    if (!kept) values.keep(*owner, {&dependency, 1}, std::make_shared<XQueryKeptValue>());
+  }
+  EXPECT_EQ(text, "-+-++-");
+}
+
+TEST(KeptValues, AreNotKeptForOtherDependencies) {
+  XQueryKeptValues values;
+  const Ref<XQueryExpr> owner = XQueryLiteral::literalWithValue(integer(0));
+  const Value a = string("a");
+  const Value b = string("b");
+  std::shared_ptr<XQueryKeptValue> kept;
+  values.useAtOnce(*owner, {&a, 1}, false, kept);
+  values.useAtOnce(*owner, {&b, 1}, false, kept);
+  values.keep(*owner, {&a, 1}, std::make_shared<XQueryKeptValue>());
+  values.useAtOnce(*owner, {&b, 1}, false, kept);
+  EXPECT_FALSE(kept);
+}
+
 // --- what is kept only while nothing has changed -------------------------------------------------
 
 const Ref<XQueryExpr>& anyExpression() {

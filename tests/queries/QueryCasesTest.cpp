@@ -1,4 +1,5 @@
-// Runs the whole-query cases under tests/queries/cases. A file holds any number of cases:
+// Runs the whole-query cases under tests/queries/cases, each of them plain and planned. A file
+// holds any number of cases:
 //
 //   == what the case shows
 //   -- var n=5                      (optional, repeatable: an untyped atomic external variable)
@@ -169,6 +170,14 @@ class QueryCase : public testing::Test {
   explicit QueryCase(Case c) : _case(std::move(c)) {}
 
   void TestBody() override {
+    for (const XQueryWay way : {XQueryWay::Plain, XQueryWay::Planned}) {
+      SCOPED_TRACE(way == XQueryWay::Plain ? "plain" : "planned");
+      run(way);
+    }
+  }
+
+ private:
+  void run(XQueryWay way) {
     const TestFolder folder;
     for (const auto& [name, text] : _case.files) folder.write(name, text);
     constexpr std::string_view place = "@folder@";
@@ -182,8 +191,8 @@ class QueryCase : public testing::Test {
     }
     // The last line break belongs to the file, not to the query.
     const auto query = XQuery::xqueryWithSource(
-        std::string_view(text).substr(0, text.empty() ? 0 : text.size() - 1),
-        compileLoading(_case));
+        std::string_view(text).substr(0, text.empty() ? 0 : text.size() - 1), compileLoading(_case),
+        XQueryLimits(), way);
     const auto context = XQueryContext::xqueryContextWithNamespaces(_case.namespaces);
     Ref<XQueryError> error;
     const auto items = context->evaluateXQuery(*query, _case.constants, document, &error);
@@ -204,7 +213,6 @@ class QueryCase : public testing::Test {
     EXPECT_EQ(lines, _case.result) << _case.file << ":" << _case.line;
   }
 
- private:
   Case _case;
 };
 

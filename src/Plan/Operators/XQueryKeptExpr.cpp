@@ -1,0 +1,170 @@
+// Nobody can tell a kept outcome from one found again:
+//
+//   - what the expression reads is compared by identity: local variables, the context item or the
+//     document above it, the ordering mode; where a tree or a global variable has changed, or nodes
+//     are still being filled, nothing kept is used (Context/KeptValues.h)
+//   - what it leaves behind it leaves each time: the variables that it sets, and after a failure
+//     the focus in which that arose, which the next evaluation of the context may start from
+//   - a failure is the same error again, raised where the expression stands
+//   - reaching a limit is no outcome
+//
+// With diagnostics on, which show each error as it is made, everything is evaluated.
+#include "Plan/Operators/XQueryKeptExpr.h"
+
+#include "Context/XQueryContextInternal.h"
+#include "Platform/Base/NSLog.h"
+#include "xquery/Collection.h"
+#include "xquery/Number.h"
+#include "xquery/XMLNode.h"
+
+#include <array>
+#include <memory>
+#include <span>
+#include <vector>
+
+namespace xquery {
+
+// What the expression reads, as it is now.
+class XQueryKeptExpr::Dependencies {
+ public:
+  // `isKnown` is false where there is no telling: the document above what is no node.
+  Dependencies(const XQueryFacts& facts, const XQueryContextInternal& context) {
+    add(NSNumber::numberWithBool(context.ordered()));
+    if (facts.does(XQueryDeeds::ReadsItem)) {
+      add(context.contextItem());
+    } else if (facts.does(XQueryDeeds::ReadsRoot)) {
+      const auto* node = dyn_cast<NSXMLNode>(context.contextItem());
+      isKnown = node != nullptr;
+      if (node) add(node->rootNode());
+    }
+    facts.reads.forEach([&](int64_t varID) { add(context.variableForID(varID)); });
+  }
+  std::span<const Value> values() const { return {_values.data(), _count}; }
+
+  bool isKnown = true;
+
+ private:
+  void add(Value value) { _values[_count++] = std::move(value); }
+
+  std::array<Value, mostVariables + 2> _values;
+  size_t _count = 0;
+};
+
+// Which of the variables that it may set one evaluation did set. A mark is put into those whose
+// former values it does not read, so that one that is set to what it was already is seen as well.
+class XQueryKeptExpr::Assignments {
+ public:
+  Assignments(const XQueryFacts& facts, XQueryContextInternal& context) : _context(context) {
+    facts.assigns.forEach([&](int64_t varID) {
+      XQueryVariableSet own;
+      own.add(varID);
+      Value former = context.variableForID(varID);
+      const bool isMarked = former && !facts.reads.meets(own);
+      if (isMarked) context.setVariable(_mark, varID);
+      _variables.push_back({varID, std::move(former), isMarked});
+    });
+  }
+
+  // After the evaluation. False where there is no telling: a slot that there was not yet and holds
+  // the empty sequence may have come with a later one.
+  bool finish() {
+    bool isKnown = true;
+    for (Variable& variable : _variables) {
+      const Value value = _context.variableForID(variable.varID);
+      if (variable.isMarked && value == _mark) {
+        _context.setVariable(std::move(variable.value), variable.varID);
+        variable.varID = 0;
+        continue;
+      }
+      if (!variable.value && value && value->kind() == Kind::Null) isKnown = false;
+      if (!value) variable.varID = 0;
+      variable.value = value;
+    }
+    return isKnown;
+  }
+
+  // Sets the variables as the evaluation left them.
+  void replay(XQueryContextInternal& context) const {
+    for (const Variable& variable : _variables) {
+      context.setVariable(variable.value, variable.varID);
+    }
+  }
+
+ private:
+  struct Variable {
+    int64_t varID;  // 0, which sets nothing, for one that was not set
+    Value value;    // the former one, and afterwards the one that was set
+    bool isMarked;
+  };
+
+  XQueryContextInternal& _context;
+  const Value _mark = NSArray::array();
+  std::vector<Variable> _variables;
+};
+
+class XQueryKeptExpr::Outcome final : public XQueryKeptValue {
+ public:
+  // Of an evaluation that has just been done.
+  Outcome(Value value, Assignments assignments, const XQueryContextInternal& context)
+      : _value(std::move(value)), _assignments(std::move(assignments)) {
+    if (_value || !context.isFailing()) return;
+    _error = context.error();
+    _item = context.contextItem();
+    _position = context.position();
+    _last = context.last();
+  }
+
+  Value replay(XQueryContextInternal& context) const {
+    _assignments.replay(context);
+    if (!_error) return _value;
+    context.setContextItem(_item, _position);
+    context.setLast(_last);
+    return context.fail(_error);
+  }
+
+ private:
+  Value _value;
+  Assignments _assignments;
+  Ref<XQueryError> _error;  // null unless the evaluation failed
+  Value _item;
+  int64_t _position = 0;
+  int64_t _last = 0;
+};
+
+bool XQueryKeptExpr::canKeep(const XQueryFacts& facts) {
+  if (!facts.isRepeatable() || !facts.reads.isExact() || !facts.assigns.isExact()) return false;
+  if (facts.does(XQueryDeeds::ReadsPosition | XQueryDeeds::ReadsSize)) return false;
+  // What is around the nodes of a global variable is looked at by nobody.
+  if (facts.does(XQueryDeeds::ReadsOutside) && facts.does(XQueryDeeds::ReadsGlobals)) return false;
+  return facts.reads.count() <= mostVariables;
+}
+
+Ref<XQueryKeptExpr> XQueryKeptExpr::exprWithPlain(Ref<XQueryExpr> plain, const XQueryFacts& facts) {
+  return make<XQueryKeptExpr>(std::move(plain), facts);
+}
+
+Value XQueryKeptExpr::computeValue(XQueryContext& context) const {
+  auto& dynamic = context._internal();
+  auto& keptValues = dynamic.keptValues();
+  if (keptValues.looksAway(*this) || XQueryLogEnabled()) {
+    return plain().evaluateWithContext(context);
+  }
+  const Dependencies dependencies(_facts, dynamic);
+  if (!dependencies.isKnown) return plain().evaluateWithContext(context);
+  std::shared_ptr<XQueryKeptValue> kept;
+  const auto use = keptValues.useAtOnce(*this, dependencies.values(),
+                                        _facts.does(XQueryDeeds::ReadsOutside), kept);
+  if (use == XQueryKeptValues::Use::Further && kept) {
+    return std::static_pointer_cast<Outcome>(kept)->replay(dynamic);
+  }
+  if (use != XQueryKeptValues::Use::Second) return plain().evaluateWithContext(context);
+  Assignments assignments(_facts, dynamic);
+  Value value = plain().evaluateWithContext(context);
+  const bool isKnown = assignments.finish() && !dynamic.isFailingForGood();
+  std::shared_ptr<Outcome> outcome;
+  if (isKnown) outcome = std::make_shared<Outcome>(value, std::move(assignments), dynamic);
+  keptValues.keep(*this, dependencies.values(), std::move(outcome));
+  return value;
+}
+
+}  // namespace xquery

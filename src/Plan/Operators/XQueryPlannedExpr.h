@@ -1,0 +1,34 @@
+// The base of the planner's operators.
+//
+// An operator is an expression that stands in the place of another one and answers what that one
+// would answer. It keeps the expression it stands for: to take the plain way where its own is not
+// open, and to be shown.
+#pragma once
+
+#include "Expr/XQueryExpr.h"
+#include "Expr/XQueryParts.h"
+
+#include <utility>
+
+namespace xquery {
+
+class XQueryPlannedExpr : public XQueryExpr {
+ public:
+  static bool classof(const NSObject& object) { return object.kind() == Kind::PlannedExpr; }
+
+  const XQueryExpr& plain() const { return *_plain; }
+  // What it stands for has been bound.
+  void bindInfoForProlog(XQueryProlog&) override {}
+  void visitParts(XQueryPartVisitor& visitor) override {
+    visitor.ownPart(_plain.get(), XQueryRole::Element);
+  }
+
+ protected:
+  explicit XQueryPlannedExpr(Ref<XQueryExpr> plain)
+      : XQueryExpr(Kind::PlannedExpr, plain->exprLine()), _plain(std::move(plain)) {}
+
+ private:
+  Ref<XQueryExpr> _plain;
+};
+
+}  // namespace xquery

@@ -1,0 +1,31 @@
+// Planning: a bound program is gone over once, and expressions are replaced by operators that
+// answer the same with less work.
+//
+//   bound program --> places (Program.h) --> facts (FactsAnalysis.h) --> rules (Rules.h), in turn
+//                                                                          |
+//                          operators (Operators/), which keep the expressions they stand for
+//
+// A planned program is as immutable as a bound one. Nobody can tell it from the plain one but by
+// the time it takes.
+#pragma once
+
+#include "Expr/XQueryExpr.h"
+#include "Plan/Rules.h"
+
+#include <span>
+
+namespace xquery {
+
+class XQueryProlog;
+
+// Whether queries are planned: unless the environment variable XQUERY_PLAN is "0". Read anew at
+// each call.
+bool XQueryPlanIsEnabled();
+
+// Plans the body of a query, which may be null, with the functions and global variables of its
+// module and of the modules that it imports. Everything has been bound without errors. Answers the
+// planned body.
+Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
+                              std::span<const XQueryRule> rules = XQueryRules());
+
+}  // namespace xquery

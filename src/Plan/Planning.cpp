@@ -1,0 +1,47 @@
+#include "Plan/Planning.h"
+
+#include "Functions/XQueryFunctionCall.h"
+
+#include <algorithm>
+
+namespace xquery {
+namespace {
+
+// Whether a call may hand on items of its arguments.
+bool handsOnArguments(const XQueryFunctionCall& call) {
+  const auto* builtIn = call.builtIn();
+  if (!builtIn) return true;
+  constexpr XQueryItemKinds handedOn = XQueryBuiltInFunction::OfFirst |
+                                       XQueryBuiltInFunction::OfAll |
+                                       XQueryBuiltInFunction::AtomizedFirst | XQueryItems::Other;
+  return (builtIn->row().answer.kinds & handedOn) != 0 ||
+         builtIn->row().has(XQueryBuiltInFunction::Traces);
+}
+
+}  // namespace
+
+bool XQueryPlanning::showsIdentity(XQueryPlaceID place) const {
+  for (int level = 0; place != XQueryNoPlace && level < mostLevels; ++level) {
+    const XQueryPlace& at = program[place];
+    // The results of a path hold each object once, atomic ones as well.
+    if (at.role == XQueryRole::Step) return true;
+    if (!XQueryTraitsOf(at.role).handsOn) return false;
+    place = at.parent;
+    if (at.role != XQueryRole::Arguments) continue;
+    const auto* call = dyn_cast<XQueryFunctionCall>(program[place].expr);
+    if (call && !handsOnArguments(*call)) return false;
+  }
+  return true;
+}
+
+void XQueryPlanning::wrap(XQueryPlaceID place, Ref<XQueryExpr> by) {
+  program.replace(place, std::move(by));
+  _states[place] = State::Wrapped;
+}
+
+void XQueryPlanning::replace(XQueryPlaceID place, Ref<XQueryExpr> by) {
+  program.replace(place, std::move(by));
+  std::fill(_states.begin() + place, _states.begin() + program[place].end, State::Gone);
+}
+
+}  // namespace xquery

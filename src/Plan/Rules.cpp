@@ -1,0 +1,23 @@
+#include "Plan/Rules.h"
+
+#include <array>
+
+namespace xquery {
+namespace {
+
+constexpr std::array rules = {
+    XQueryRule{"constants", "what consists of literals alone is evaluated once, beforehand",
+               XQueryFoldConstants},
+    XQueryRule{"names", "comparing name() or local-name() with a constant makes no string",
+               XQueryCompareNames},
+    XQueryRule{"invariants", "what does not change in a loop is kept from one turn to the next",
+               XQueryKeepInvariants},
+};
+
+}  // namespace
+
+std::span<const XQueryRule> XQueryRules() {
+  return rules;
+}
+
+}  // namespace xquery

@@ -1,0 +1,29 @@
+// The rules of the planner, in the order in which they run.
+//
+// A rule is one file of Rules/: the pattern, what must hold of the facts, the operator that takes
+// over, and why nobody can tell. To add one: write the file, declare its function below, give it a
+// row in the table of Rules.cpp, and add an example to docs/plan.md.
+#pragma once
+
+#include <span>
+#include <string_view>
+
+namespace xquery {
+
+class XQueryPlanning;
+
+struct XQueryRule {
+  std::string_view name;
+  // What it is about, in a line.
+  std::string_view summary;
+  // Goes over the program once.
+  void (*apply)(XQueryPlanning& planning);
+};
+
+std::span<const XQueryRule> XQueryRules();
+
+void XQueryFoldConstants(XQueryPlanning& planning);
+void XQueryCompareNames(XQueryPlanning& planning);
+void XQueryKeepInvariants(XQueryPlanning& planning);
+
+}  // namespace xquery

@@ -1,0 +1,125 @@
+// What consists of literals alone.
+//
+// Pattern     an operator (arithmetic, comparison, "and", "or", a sign), "cast as", "castable as",
+//             or a constructor function, each over single literals or what has become one
+// Facts       the value is not handed on: the same literal each time would be one object, and equal
+//             items that are different objects can be told apart
+// Operator    a literal
+// Why         all of these look at their operands only, and a value of one item is all they answer;
+//             what fails is left as it was written, since it may never be reached
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/TypeTests/XQueryTypeExprs.h"
+#include "Expr/XQueryLeaves.h"
+#include "Expr/XQuerySequence.h"
+#include "Functions/XQueryFunctionCall.h"
+#include "Plan/Planning.h"
+#include "Plan/Rules.h"
+#include "xquery/XQuery.h"
+
+#include <vector>
+
+namespace xquery {
+namespace {
+
+bool isSingleAtom(const Value& value) {
+  return value && (XQueryKindsOfItem(*value) & XQueryItems::Atomic) != 0;
+}
+
+class Folding {
+ public:
+  explicit Folding(XQueryPlanning& planning)
+      : _planning(planning), _isConstant(planning.program.placeCount()) {}
+
+  void run() {
+    for (const XQueryPlaceID place : _planning.program.partsFirst()) {
+      _isConstant[place] = isConstant(place);
+    }
+    // Whole ones first, so that what lies inside of them is left alone.
+    for (XQueryPlaceID place = 0; place < _planning.program.placeCount(); ++place) {
+      const Kind kind = _planning.program[place].expr->kind();
+      if (!_isConstant[place] || kind == Kind::Literal || kind == Kind::ExprList ||
+          kind == Kind::Args) {
+        continue;
+      }
+      if (_planning.isOpen(place) && !_planning.showsIdentity(place)) fold(place);
+    }
+  }
+
+ private:
+  const XQueryPlace& at(XQueryPlaceID place) const { return _planning.program[place]; }
+
+  bool isConstant(XQueryPlaceID place) const {
+    const XQueryExpr& expr = *at(place).expr;
+    switch (expr.kind()) {
+      case Kind::Literal:
+        return isSingleAtom(cast<XQueryLiteral>(&expr)->literalValue());
+      case Kind::ExprList:
+      case Kind::Args:
+        return partsAreConstant(place, 1);
+      case Kind::OperatorExpr:
+        return isFoldable(*cast<XQueryOperatorExpr>(&expr)) && partsAreConstant(place, 2);
+      case Kind::CastExpr:
+      case Kind::CastableExpr:
+        return castIsFoldable(*cast<XQueryTypedExpr>(&expr)) && partsAreConstant(place, 1);
+      case Kind::FunctionCall:
+        return isConstructor(*cast<XQueryFunctionCall>(&expr)) && partsAreConstant(place, 1);
+      default:
+        return false;
+    }
+  }
+
+  // One at least, and `most` at most, that are values.
+  bool partsAreConstant(XQueryPlaceID whole, size_t most) const {
+    size_t count = 0;
+    for (XQueryPlaceID part = _planning.program.firstPart(whole); part != XQueryNoPlace;
+         part = _planning.program.nextPart(part)) {
+      if (XQueryTraitsOf(at(part).role).isNoValue) continue;
+      if (!_isConstant[part] || ++count > most) return false;
+    }
+    return count > 0;
+  }
+
+  static bool isFoldable(const XQueryOperatorExpr& expr) {
+    const int operatorClass = XQueryOperatorExpr::operatorClassification(expr.operatorType());
+    return operatorClass == 1 || operatorClass == 2 || operatorClass == 5 || operatorClass == 6;
+  }
+  // A cast to a QName looks for prefixes in what is around it.
+  static bool castIsFoldable(const XQueryTypedExpr& expr) {
+    return expr.type().typeID() != XQueryTypeQName && expr.type().typeID() != XQueryTypeNone;
+  }
+  static bool isConstructor(const XQueryFunctionCall& call) {
+    const XQueryBuiltInFunction* function = call.builtIn();
+    if (!function) return false;
+    const auto& row = function->row();
+    return (row.namespaceID == XQueryNamespaceXS || row.namespaceID == XQueryNamespaceXDT) &&
+           row.readsArgumentsOnly(1);
+  }
+
+  void fold(XQueryPlaceID place) {
+    if (!_context) _context = XQueryContext::xqueryContext();
+    const Value value = normalised(at(place).expr->evaluateWithContext(*_context));
+    if (XQueryHasFailed(value, *_context)) {
+      // What ends the compilation ends it; anything else comes up when it is reached.
+      if (_context->_internal().isFailingForGood()) _context->_internal().throwFailure();
+      _context->_internal().passOverFailure(nullptr);
+      return;
+    }
+    if (!isSingleAtom(value)) return;
+    auto literal = XQueryLiteral::literalWithValue(value);
+    literal->setExprLine(at(place).expr->exprLine());
+    _planning.replace(place, std::move(literal));
+  }
+
+  XQueryPlanning& _planning;
+  std::vector<bool> _isConstant;
+  Ref<XQueryContext> _context;  // made for the first one
+};
+
+}  // namespace
+
+void XQueryFoldConstants(XQueryPlanning& planning) {
+  Folding(planning).run();
+}
+
+}  // namespace xquery

@@ -1,0 +1,167 @@
+// What does not change in a loop.
+//
+// Pattern     an expression that is evaluated again and again, by a clause, a predicate, a step, a
+//             quantifier or the calls of a function around it, reads nothing that differs from one
+//             time to the next, and takes more work than looking that up: it holds a path of some
+//             length, a FLWOR, a quantifier or a call of a declared function
+// Facts       it is repeatable; all that it reads is known one by one; its items are nodes, or
+//             which objects they are cannot be told
+// Operator    XQueryKeptExpr: evaluates it when it is first needed, and keeps the outcome
+// Why         see there; the facts choose where it is worth the trouble, what is compared at each
+//             use decides whether the outcome is still good
+#include "Expr/Clauses/XQueryFLWOR.h"
+#include "Expr/Clauses/XQueryQuantified.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/Paths/XQueryPath.h"
+#include "Expr/XQueryBinding.h"
+#include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryLists.h"
+#include "Functions/XQueryFunctionCall.h"
+#include "Plan/Operators/XQueryKeptExpr.h"
+#include "Plan/Planning.h"
+#include "Plan/Rules.h"
+
+namespace xquery {
+namespace {
+
+XQueryVariableSet variablesOf(const XQueryBindingExpr& clause) {
+  XQueryVariableSet variables;
+  variables.add(clause.varID());
+  if (const auto* forExpr = dyn_cast<XQueryForExpr>(&clause)) variables.add(forExpr->posVarID());
+  return variables;
+}
+
+// A path from a variable or the context item over a few children or attributes is done as quickly
+// as looked up.
+bool isShort(const XQueryPathExpr& path) {
+  constexpr int fewSteps = 3;
+  int steps = 0;
+  for (const XQueryStep* step = path.step(); step; step = step->next()) {
+    if (!step->predicates().empty() || ++steps > fewSteps) return false;
+    const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
+    if (!axisStep && (step != path.step() || !dyn_cast<XQueryVariable>(step->expr()))) return false;
+    if (!axisStep) continue;
+    const int axis = axisStep->axis();
+    if (axis != XQueryAxisChild && axis != XQueryAxisAttribute && axis != XQueryAxisSelf &&
+        axis != XQueryAxisParent) {
+      return false;
+    }
+  }
+  return true;
+}
+
+class Search {
+ public:
+  explicit Search(XQueryPlanning& planning)
+      : _planning(planning),
+        _program(planning.program),
+        _isLaborious(planning.program.placeCount()) {}
+
+  void run() {
+    for (const XQueryPlaceID place : _program.partsFirst()) {
+      _isLaborious[place] = _isLaborious[place] || isLaborious(*at(place).expr);
+      const XQueryPlaceID whole = at(place).parent;
+      if (whole != XQueryNoPlace && _isLaborious[place]) _isLaborious[whole] = true;
+    }
+    for (XQueryPlaceID place = 0; place < _program.placeCount(); ++place) {
+      if (_isLaborious[place] && canBeKept(place) && isInvariantSomewhere(place)) {
+        _planning.wrap(place, XQueryKeptExpr::exprWithPlain(*at(place).slot, facts(place)));
+      }
+    }
+  }
+
+ private:
+  const XQueryPlace& at(XQueryPlaceID place) const { return _program[place]; }
+  const XQueryFacts& facts(XQueryPlaceID place) const { return _planning.facts[place]; }
+
+  static bool isLaborious(const XQueryExpr& expr) {
+    switch (expr.kind()) {
+      case Kind::PathExpr:
+        return !isShort(*cast<XQueryPathExpr>(&expr));
+      case Kind::FLWORExpr:
+      case Kind::QuantifiedExpr:
+        return true;
+      case Kind::FunctionCall:
+        return cast<XQueryFunctionCall>(&expr)->functionDecl() != nullptr;
+      default:
+        return false;
+    }
+  }
+
+  bool canBeKept(XQueryPlaceID place) const {
+    const XQueryPlace& here = at(place);
+    if (!_planning.isOpen(place) || XQueryTraitsOf(here.role).isNoValue) return false;
+    if (here.expr->kind() == Kind::RootStepExpr || here.expr->kind() == Kind::Args) return false;
+    // What is in parentheses is looked at by itself.
+    const auto* list = dyn_cast<XQueryExprList>(here.expr);
+    if (list && list->count() == 1) return false;
+    // Loops walk ranges without making them.
+    const auto* range = dyn_cast<XQueryOperatorExpr>(here.expr);
+    if (range && range->operatorType() == XQueryOperatorTo) return false;
+    if (!XQueryKeptExpr::canKeep(facts(place))) return false;
+    return facts(place).are(XQueryItems::Node) || !_planning.showsIdentity(place);
+  }
+
+  // Whether some loop around it leaves all that it reads as it is.
+  bool isInvariantSomewhere(XQueryPlaceID place) const {
+    const XQueryFacts& own = facts(place);
+    XQueryPlaceID inner = place;
+    for (int level = 0; level < XQueryPlanning::mostLevels; ++level, inner = at(inner).parent) {
+      if (inner != place && _planning.isWrapped(inner)) return false;
+      const XQueryRole role = at(inner).role;
+      if (role == XQueryRole::Body) {
+        // A function may be called any number of times, in any focus.
+        return _program.bodyOf(inner).function && own.reads.isEmpty() &&
+               !own.does(XQueryDeeds::ReadsItem);
+      }
+      if (XQueryTraitsOf(role).hasOwnFocus) return !own.does(XQueryDeeds::ReadsItem);
+      switch (loopAround(inner, own.reads)) {
+        case Loop::Found:
+          return true;
+        case Loop::Changes:
+          return false;
+        case Loop::None:
+          break;
+      }
+    }
+    return false;
+  }
+
+  enum class Loop : uint8_t { None, Found, Changes };
+
+  // Whether the expression around a part evaluates it in a loop that sets none of the variables.
+  Loop loopAround(XQueryPlaceID part, const XQueryVariableSet& reads) const {
+    const XQueryPlaceID whole = at(part).parent;
+    const Kind kind = at(whole).expr->kind();
+    if (kind == Kind::CaseClause) {
+      const bool isRead = variablesOf(*cast<XQueryBindingExpr>(at(whole).expr)).meets(reads);
+      return isRead ? Loop::Changes : Loop::None;
+    }
+    if (kind != Kind::FLWORExpr && kind != Kind::QuantifiedExpr) return Loop::None;
+    bool isLoop = false;
+    bool isRead = false;  // what was set since the last loop began
+    for (XQueryPlaceID each = _program.firstPart(whole); each != part;
+         each = _program.nextPart(each)) {
+      const auto* clause = dyn_cast<XQueryBindingExpr>(at(each).expr);
+      if (!clause) continue;
+      // Of several loops, one in the other, the innermost.
+      const bool begins = clause->kind() != Kind::LetExpr;
+      if (begins) isLoop = true;
+      isRead = (isRead && !begins) || variablesOf(*clause).meets(reads);
+    }
+    if (isRead) return Loop::Changes;
+    return isLoop ? Loop::Found : Loop::None;
+  }
+
+  XQueryPlanning& _planning;
+  const XQueryProgram& _program;
+  std::vector<bool> _isLaborious;
+};
+
+}  // namespace
+
+void XQueryKeepInvariants(XQueryPlanning& planning) {
+  Search(planning).run();
+}
+
+}  // namespace xquery

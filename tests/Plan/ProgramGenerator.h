@@ -1,0 +1,285 @@
+// Random programs over random documents. The same seed makes the same.
+#pragma once
+
+#include "Expr/RandomChoices.h"
+
+#include <string>
+#include <vector>
+
+namespace xquery::plantest {
+
+class ProgramGenerator {
+ public:
+  explicit ProgramGenerator(unsigned seed) : _random(seed) {}
+
+  // Elements a, b, c with attributes x and y, small numbers and words for texts.
+  std::string document() {
+    std::string text = "<a>";
+    const size_t count = 2 + _random.below(5);
+    for (size_t i = 0; i < count; ++i) text += element(3);
+    return text + "</a>";
+  }
+
+  std::string program() {
+    _functions.clear();
+    std::string text;
+    _variables = {};
+    if (_random.below(3) == 0) text += "declare variable $g := " + expr(2) + ";\n";
+    _hasGlobal = !text.empty();
+    if (_random.below(2) == 0) text += function("local:f", "");
+    if (_random.below(3) == 0) text += function("local:r", "local:r");
+    return text + expr(5);
+  }
+
+ private:
+  std::string element(int depth) {
+    const std::string name = _random.oneOf({"a", "b", "c"});
+    std::string text = "<" + name;
+    if (_random.below(2)) text += " x='" + word() + "'";
+    if (_random.below(3) == 0) text += " y='" + word() + "'";
+    text += ">";
+    const size_t count = depth == 0 ? 0 : _random.below(4);
+    for (size_t i = 0; i < count; ++i) text += element(depth - 1);
+    if (count == 0) text += word();
+    return text + "</" + name + ">";
+  }
+
+  std::string word() { return _random.oneOf({"1", "2", "3", "10", "2.5", "u", "v", "", "-1"}); }
+
+  // A function of one parameter. One that calls itself does so with less each time.
+  std::string function(const std::string& name, const std::string& recursion) {
+    _variables = {"$p"};
+    std::string body = expr(3);
+    if (!recursion.empty()) {
+      body = "if (not($p castable as xs:integer) or number($p) < 1 or number($p) > 6) then " +
+             body + " else (" + expr(1) + ", " + recursion + "(number($p) - 1))";
+    }
+    _variables = {};
+    _functions.push_back(name);
+    return "declare function " + name + "($p) {" + body + "};\n";
+  }
+
+  std::string literal() {
+    return _random.oneOf({"1", "2", "3", "10", "2.5", "1e0", "'u'", "'1'", "'a'", "()", "''"});
+  }
+
+  std::string constant() {
+    static const std::vector<std::string> operators = {" + ", " * ", " div ", " = ", " < ", " eq "};
+    return "(" + literal() + _random.oneOf(operators) + literal() + ")";
+  }
+
+  std::string variable() {
+    if (_variables.empty()) return _hasGlobal && _random.below(2) ? "$g" : ".";
+    return _variables[_random.below(_variables.size())];
+  }
+
+  std::string nodeTest() {
+    return _random.oneOf({"a", "b", "c", "*", "a", "b", "text()", "node()"});
+  }
+
+  std::string predicate(int depth) {
+    switch (_random.below(8)) {
+      case 0:
+        return "[" + _random.oneOf({"1", "2", "last()", "position() < 3"}) + "]";
+      case 1:
+        return "[" + _random.oneOf({"@x", "b", "c/a", "not(@y)"}) + "]";
+      case 2:
+        return "[" + _random.oneOf({"name()", "local-name(.)", "name(.)"}) +
+               _random.oneOf({" = ", " eq ", " != "}) + _random.oneOf({"'a'", "'b'", "'x'"}) + "]";
+      default:
+        return "[" + comparison(depth - 1) + "]";
+    }
+  }
+
+  std::string step(int depth) {
+    std::string text = _random.oneOf({"/", "/", "//"});
+    text += _random.oneOf({"", "", "", "", "@", "..", "self::", "following-sibling::",
+                           "preceding-sibling::", "ancestor::", "descendant::", "following::"});
+    if (text.ends_with("..")) return text;
+    text += text.ends_with("@") ? _random.oneOf({"x", "y", "*"}) : nodeTest();
+    if (depth > 0 && _random.below(3) == 0) text += predicate(depth);
+    return text;
+  }
+
+  std::string path(int depth) {
+    std::string text = _random.oneOf({"", "", variable(), variable(), "."});
+    if (text == "." && _random.below(2)) text = "(" + expr(depth - 1) + ")";
+    const size_t steps = 1 + _random.below(3);
+    for (size_t i = 0; i < steps; ++i) text += step(depth);
+    if (_random.below(8) == 0) text += "/(" + expr(depth - 1) + ")";
+    return text;
+  }
+
+  std::string comparison(int depth) {
+    static const std::vector<std::string> operators = {" = ",  " = ",  " != ", " < ", " > ",
+                                                       " >= ", " eq ", " lt ", " ne "};
+    return operand(depth) + _random.oneOf(operators) + operand(depth);
+  }
+
+  std::string operand(int depth) {
+    switch (_random.below(10)) {
+      case 0:
+        return literal();
+      case 9:
+        return constant();
+      case 1:
+        return "number(" + expr(depth - 1) + ")";
+      case 2:
+        return _random.oneOf(
+                   {"exactly-one(", "zero-or-one(", "string(", "data(", "max(", "count(", "sum("}) +
+               path(depth - 1) + ")";
+      case 3:
+        return "@" + _random.oneOf({"x", "y"});
+      case 4:
+        return variable();
+      case 5:
+        return "xs:integer(" + _random.oneOf({"'1'", "'u'", "2"}) + ")";
+      default:
+        return path(depth - 1);
+    }
+  }
+
+  // With one more variable in scope.
+  template <class Make>
+  std::string within(const std::string& variable, Make make) {
+    _variables.push_back(variable);
+    std::string text = make();
+    _variables.pop_back();
+    return text;
+  }
+
+  std::string flwor(int depth) {
+    const std::string name = _random.oneOf({"$i", "$j", "$k"});
+    const bool isLet = _random.below(3) == 0;
+    const bool hasPosition = !isLet && _random.below(5) == 0;
+    std::string text = (isLet ? "let " : "for ") + name + (hasPosition ? " at $n" : "") +
+                       (isLet ? " := " : " in ") + expr(depth - 1) + " ";
+    if (hasPosition) _variables.emplace_back("$n");
+    text += within(name, [&] {
+      std::string rest;
+      if (_random.below(3) == 0) {
+        rest = "for $m in " + path(depth - 1) + " ";
+        _variables.emplace_back("$m");
+      }
+      const bool hasInner = !rest.empty();
+      if (_random.below(2)) rest += "where " + comparison(depth - 1) + " ";
+      if (_random.below(5) == 0) rest += "order by string(" + operand(depth - 1) + ") ";
+      rest += "return " + expr(depth - 1);
+      if (hasInner) _variables.pop_back();
+      return rest;
+    });
+    if (hasPosition) _variables.pop_back();
+    return "(" + text + ")";
+  }
+
+  std::string quantified(int depth) {
+    const bool isDouble = _random.below(3) == 0;
+    std::string text = _random.oneOf({"some", "every"}) + " $q in " + expr(depth - 1);
+    text += within("$q", [&] {
+      std::string rest;
+      if (isDouble) {
+        rest = ", $s in " + expr(depth - 1);
+        _variables.emplace_back("$s");
+      }
+      rest += " satisfies " + comparison(depth - 1);
+      if (isDouble) _variables.pop_back();
+      return rest;
+    });
+    return "(" + text + ")";
+  }
+
+  std::string constructor(int depth) {
+    switch (_random.below(5)) {
+      case 0:
+        return "<b x='{" + operand(depth - 1) + "}'>{" + expr(depth - 1) + "}</b>";
+      case 1:
+        return "element a {" + expr(depth - 1) + "}";
+      case 2:
+        return "text {" + expr(depth - 1) + "}";
+      case 3:
+        return "document {<a>{" + expr(depth - 1) + "}</a>}";
+      default:
+        return "<c>{" + variable() + ", count(" + variable() + "/..)}</c>";
+    }
+  }
+
+  std::string call(int depth) {
+    static const std::vector<std::string> functions = {
+        "count",       "exists",    "empty",  "not",         "string",      "distinct-values",
+        "reverse",     "boolean",   "data",   "exactly-one", "zero-or-one", "normalize-space",
+        "sum",         "max",       "number", "name",        "root",        "unordered",
+        "one-or-more", "upper-case"};
+    if (!_functions.empty() && _random.below(2)) {
+      return _functions[_random.below(_functions.size())] + "(" + expr(depth - 1) + ")";
+    }
+    if (_random.below(5) == 0) {
+      return "subsequence(" + expr(depth - 1) + ", " + _random.oneOf({"1", "2"}) + ")";
+    }
+    return functions[_random.below(functions.size())] + "(" + expr(depth - 1) + ")";
+  }
+
+  std::string other(int depth) {
+    switch (_random.below(5)) {
+      case 0:
+        return "(if (" + comparison(depth - 1) + ") then " + expr(depth - 1) + " else " +
+               expr(depth - 1) + ")";
+      case 1: {
+        const std::string text =
+            "typeswitch (" + expr(depth - 1) + ") case $t as element() return ";
+        return "(" + text + within("$t", [&] { return expr(depth - 1); }) + " default return " +
+               expr(depth - 1) + ")";
+      }
+      case 2:
+        return "(" + expr(depth - 1) + _random.oneOf({" | ", " intersect ", " except "}) +
+               path(depth - 1) + ")";
+      case 3:
+        return "(" + expr(depth - 1) +
+               _random.oneOf({" instance of element()", " castable as xs:integer",
+                              " treat as item()*", " cast as xs:double?"}) +
+               ")";
+      default:
+        return "unordered {" + path(depth - 1) + "}";
+    }
+  }
+
+  std::string expr(int depth) {
+    if (depth <= 0) return _random.below(3) ? variable() : literal();
+    switch (_random.below(14)) {
+      case 0:
+        return literal();
+      case 1:
+        return variable();
+      case 2:
+        return "(" + expr(depth - 1) + ", " + expr(depth - 1) + ")";
+      case 3:
+        if (_random.below(2)) return constant();
+        return "(" + operand(depth - 1) + _random.oneOf({" + ", " - ", " * ", " div "}) +
+               operand(depth - 1) + ")";
+      case 4:
+        return "(" + comparison(depth - 1) + ")";
+      case 5:
+      case 6:
+        return flwor(depth);
+      case 7:
+        return quantified(depth);
+      case 8:
+        return constructor(depth);
+      case 9:
+        return call(depth);
+      case 10:
+        return other(depth);
+      case 11:
+        return "(" + comparison(depth - 1) + _random.oneOf({" and ", " or "}) +
+               comparison(depth - 1) + ")";
+      default:
+        return path(depth);
+    }
+  }
+
+  RandomChoices _random;
+  std::vector<std::string> _variables;
+  std::vector<std::string> _functions;
+  bool _hasGlobal = false;
+};
+
+}  // namespace xquery::plantest
