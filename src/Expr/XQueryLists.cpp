@@ -50,6 +50,15 @@ void XQueryArgs::visitParts(XQueryPartVisitor& visitor) {
   _storage.forEach([&](Ref<XQueryExpr>& part) { visitor.part(part, XQueryRole::Argument); });
 }
 
+const XQueryExpr* XQueryWithoutParentheses(const XQueryExpr* expr) {
+  const auto* list = dyn_cast<XQueryExprList>(expr);
+  while (list && list->kind() == Kind::ExprList && list->count() == 1) {
+    expr = list->objectAtIndex(0);
+    list = dyn_cast<XQueryExprList>(expr);
+  }
+  return expr;
+}
+
 Value XQueryArgs::computeValue(XQueryContext& context) const {
   auto arguments = NSArray::array();
   arguments->objects().reserve(count());

@@ -38,6 +38,9 @@ class XQueryExprList : public XQueryExpr {
   SingleOrArray<XQueryExpr> _storage;
 };
 
+// What stands in parentheses, however many; anything else, null included, is the answer itself.
+const XQueryExpr* XQueryWithoutParentheses(const XQueryExpr* expr);
+
 // The argument list of a call: its value has one entry per argument, each in any shape.
 class XQueryArgs : public XQueryExprList {
  public:

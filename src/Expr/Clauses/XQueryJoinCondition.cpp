@@ -14,15 +14,6 @@ namespace {
 // Longer chains of conditions are left alone.
 constexpr size_t mostConditions = 16;
 
-const XQueryExpr* withoutParentheses(const XQueryExpr* expr) {
-  const auto* list = dyn_cast<XQueryExprList>(expr);
-  while (list && list->kind() == Kind::ExprList && list->count() == 1) {
-    expr = list->objectAtIndex(0);
-    list = dyn_cast<XQueryExprList>(expr);
-  }
-  return expr;
-}
-
 // The value comparison code whose relation the operator asks for.
 std::optional<int> relationCode(int type) {
   switch (type) {
@@ -81,7 +72,7 @@ std::vector<const XQueryExpr*> conjuncts(const XQueryExpr* condition) {
   std::vector<const XQueryExpr*> found;
   std::vector<const XQueryExpr*> waiting = {condition};
   while (!waiting.empty()) {
-    const XQueryExpr* next = withoutParentheses(waiting.back());
+    const XQueryExpr* next = XQueryWithoutParentheses(waiting.back());
     waiting.pop_back();
     const auto* both = dyn_cast<XQueryOperatorExpr>(next);
     if (both && both->operatorType() == XQueryOperatorAnd) {

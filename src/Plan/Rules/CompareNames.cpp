@@ -22,23 +22,14 @@
 namespace xquery {
 namespace {
 
-const XQueryExpr* withoutParentheses(const XQueryExpr* expr) {
-  const auto* list = dyn_cast<XQueryExprList>(expr);
-  while (list && list->kind() == Kind::ExprList && list->count() == 1) {
-    expr = list->objectAtIndex(0);
-    list = dyn_cast<XQueryExprList>(expr);
-  }
-  return expr;
-}
-
 // Which name of the context item the expression asks for, if any.
 std::optional<XQueryNameComparison::Name> nameAskedFor(const XQueryExpr* expr) {
   const auto* call = dyn_cast<XQueryFunctionCall>(expr);
   if (!call || !call->builtIn()) return std::nullopt;
   const size_t count = call->args() ? call->args()->count() : 0;
   const bool isOfItem =
-      count == 0 ||
-      (count == 1 && isa<XQueryContextItem>(withoutParentheses(call->args()->objectAtIndex(0))));
+      count == 0 || (count == 1 && isa<XQueryContextItem>(
+                                       XQueryWithoutParentheses(call->args()->objectAtIndex(0))));
   if (!isOfItem) return std::nullopt;
   if (call->function() == fn_name) return XQueryNameComparison::Name::Qualified;
   if (call->function() == fn_local_name) return XQueryNameComparison::Name::Local;
@@ -46,7 +37,7 @@ std::optional<XQueryNameComparison::Name> nameAskedFor(const XQueryExpr* expr) {
 }
 
 const NSString* stringIn(const XQueryExpr* expr) {
-  const auto* literal = dyn_cast<XQueryLiteral>(withoutParentheses(expr));
+  const auto* literal = dyn_cast<XQueryLiteral>(XQueryWithoutParentheses(expr));
   if (!literal || !literal->literalValue()) return nullptr;
   const NSObject& value = *literal->literalValue();
   return XQueryKindsOfItem(value) == XQueryItems::String ? dyn_cast<NSString>(&value) : nullptr;
@@ -60,8 +51,8 @@ void XQueryCompareNames(XQueryPlanning& planning) {
     if (!comparison || !planning.isOpen(place)) continue;
     const int type = comparison->operatorType();
     if (type != XQueryOperatorEqual && type != XQueryOperatorEq) continue;
-    const XQueryExpr* left = withoutParentheses(comparison->left());
-    const XQueryExpr* right = withoutParentheses(comparison->right());
+    const XQueryExpr* left = XQueryWithoutParentheses(comparison->left());
+    const XQueryExpr* right = XQueryWithoutParentheses(comparison->right());
     auto name = nameAskedFor(left);
     const NSString* text = stringIn(right);
     if (!name) {
