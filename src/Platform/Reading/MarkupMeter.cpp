@@ -30,7 +30,10 @@ void MarkupMeter::read(std::string_view text) {
       &MarkupMeter::readTag,     &MarkupMeter::readDeclaration, &MarkupMeter::readLiteral,
       &MarkupMeter::readPassed,  &MarkupMeter::readBeyond,
   };
-  for (size_t at = 0; at < text.size();) at = (this->*steps[static_cast<size_t>(_state)])(text, at);
+  for (size_t at = 0; at < text.size();) {
+    const Step step = steps[static_cast<size_t>(_state)];
+    at = (this->*step)(text, at);
+  }
 }
 
 size_t MarkupMeter::readContent(std::string_view text, size_t at) {
