@@ -122,6 +122,7 @@ void NSXMLTree::destroy() {
     };
     if (abandonedValues->take(this, free, blockCount())) return;
   }
+  dropIndexes();
   if (NSXMLTreeExtra* present = extra()) {
     for (NSXMLDocument* document : present->documents) document->_URI->release();
   }
@@ -479,6 +480,8 @@ void NSXMLTree::merge(NSXMLTree* a, NSXMLTree* b) {
 }
 
 void NSXMLTree::absorb(NSXMLTree* smaller) {
+  dropIndexes();
+  smaller->dropIndexes();
   absorbExtra(smaller);
   absorbBaseURIs(smaller);
   NSXMLBlock* block = smaller->_lastBlock;
@@ -517,6 +520,7 @@ uint64_t NSXMLTree::finishedChangeCount() {
 }
 
 void NSXMLTree::noteTextChange(const NSXMLNode* node) {
+  of(node)->dropIndexes();
   // One that has got a parent meanwhile, by way of a child, is inside a finished one.
   if (!isUnfinished(node) || node->_parent) ++changes.ofFinished;
 }
@@ -631,6 +635,7 @@ void NSXMLTree::detach(NSXMLNode* node) {
   ++changes.all;
   ++changes.ofFinished;
   NSXMLTree* tree = of(node);
+  tree->dropIndexes();
   NSXMLNode* root = node->rootNode();
   unlink(node);
   // Taking a part out leaves the order of what remains, and of the part, as it was.

@@ -5,7 +5,7 @@
 //     last block ---------------> node                        node node node ...    text text ...
 //     names, cursors              [its text]
 //     base URIs on record
-//     era
+//     indexes, era
 //
 // The blocks of a tree form a ring (the tree knows the last, whose next is the first). The head of
 // a block names the tree; a node knows how far it is from the head of its block. So merging two
@@ -20,6 +20,7 @@
 
 #include "xquery/XMLNode.h"
 
+#include <atomic>
 #include <cstddef>
 #include <memory>
 #include <vector>
@@ -41,6 +42,7 @@ class NSXMLProcessingInstruction : public NSXMLNode {
 
 struct NSXMLTreeExtra;
 struct NSXMLNameList;
+class NSXMLTreeIndexes;
 
 // A stretch of a thread's work in which the trees that it makes can be told from those that were
 // there before: an evaluation may change the former and must leave the latter as they are, since
@@ -221,6 +223,8 @@ class NSXMLTree : public NSXMLTreeHead {
   static constexpr uint32_t staleRoot = 0;
   // Whether nodes of the tree may have different roots.
   bool hasSeveralRoots() const { return __atomic_load_n(&order, __ATOMIC_RELAXED) == SeveralRoots; }
+  // Whether it has one root and all numbers are good.
+  bool isOrderFresh() const { return __atomic_load_n(&order, __ATOMIC_ACQUIRE) == Fresh; }
   // Makes the numbers under this root good, by one thread at a time.
   void makeOrderFresh(const NSXMLNode* root);
 
@@ -257,6 +261,12 @@ class NSXMLTree : public NSXMLTreeHead {
   void freeBaseURIs();
   // Before the structure under `parent` changes.
   static void noteChange(const NSXMLNode* parent);
+  // Before anything of the tree changes: what is known of it goes.
+  void dropIndexes() {
+    if (_indexes.load(std::memory_order_relaxed)) releaseIndexes();
+  }
+  void releaseIndexes();
+  friend class NSXMLTreeIndexes;
   static void unlink(NSXMLNode* node);
   static void renumber(const NSXMLNode* root);
 
@@ -273,8 +283,10 @@ class NSXMLTree : public NSXMLTreeHead {
   static constexpr uintptr_t tagBits = 3;
   uintptr_t _extra = 0;
   NSXMLBaseURI* _baseURIs = nullptr;
-  bool _baseURIsAreAlike = true;        // of one owner, with one URI
-  uint64_t _era = NSXMLEra::current();  // in which it was made; of merged trees the older one's
+  std::atomic<NSXMLTreeIndexes*> _indexes = nullptr;  // made when they pay, see TreeIndexes.h
+  uint64_t _era : 63 =
+      NSXMLEra::current();                // in which it was made; of merged trees the older one's
+  uint64_t _baseURIsAreAlike : 1 = true;  // of one owner, with one URI
 };
 
 static_assert(sizeof(NSXMLTree) == 48 && sizeof(NSXMLBaseURI) == 32);

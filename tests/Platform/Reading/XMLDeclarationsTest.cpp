@@ -1,6 +1,6 @@
 // Documents with every kind of declaration, sound and unsound, and every way in which the reading
 // of them ends.
-#include "Platform/Base/WorkMeter.h"
+#include "Platform/Base/LookCounter.h"
 #include "Platform/Reading/IgnorantHandler.h"
 #include "Platform/Reading/LibXML.h"
 #include "Platform/Reading/LibXMLMemory.h"
@@ -96,28 +96,6 @@ std::string withAll() {
   for (const std::string& each : declarations) all += each;
   return withSubset(all);
 }
-
-// Ends the work of the thread at a given look.
-struct Ended {};
-class LookCounter final : public WorkWatcher {
- public:
-  explicit LookCounter(int looks) : _looksLeft(looks), _outer(workMeter) {
-    workMeter.watcher = this;
-    workMeter.stepsLeft = 0;
-  }
-  ~LookCounter() {
-    workMeter.watcher = _outer.watcher;
-    workMeter.stepsLeft = _outer.stepsLeft;
-  }
-  void lookAtWork() override {
-    workMeter.stepsLeft = 0;
-    if (_looksLeft-- <= 0) throw Ended();
-  }
-
- private:
-  int _looksLeft;
-  const WorkMeter _outer;
-};
 
 TEST(XMLDeclarations, EveryKindIsRead) {
   for (const std::string& each : declarations) {

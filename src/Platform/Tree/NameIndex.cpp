@@ -1,0 +1,147 @@
+#include "Platform/Tree/NameIndex.h"
+
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
+
+#include <algorithm>
+
+namespace xquery {
+
+namespace {
+
+constexpr size_t smallestTable = 16;
+
+// Navigation answers nodes that the caller may change, whoever asks.
+NSXMLNode* changeable(const NSXMLNode* node) {
+  return const_cast<NSXMLNode*>(node);
+}
+
+}  // namespace
+
+size_t NSXMLNameIndex::placeOf(const NSXMLIndexList<Name>& table, const NSXMLExpandedName* name) {
+  const size_t mask = table.size() - 1;
+  size_t place = name->hash & mask;
+  while (table[place].name && table[place].name != name) place = (place + 1) & mask;
+  return place;
+}
+
+// Notes the nodes in document order, each with the number of its name, and then puts them name by
+// name. While it does so, a name's `begin` is its number and its `end` how many nodes it has.
+class NSXMLNameIndex::Maker {
+ public:
+  Maker() : _table(smallestTable) {}
+
+  void add(const NSXMLNode* node) {
+    size_t place = placeOf(_table, node->expandedName());
+    if (!_table[place].name) place = addName(node->expandedName());
+    Name& name = _table[place];
+    ++name.end;
+    _numbers.push_back(name.begin);
+    _arrived.push_back(changeable(node));
+  }
+  std::unique_ptr<const NSXMLNameIndex> index();
+
+ private:
+  size_t addName(const NSXMLExpandedName* name) {
+    if (2 * (size_t{_nameCount} + 1) > _table.size()) grow();
+    const size_t place = placeOf(_table, name);
+    _table[place] = {name, _nameCount++, 0};
+    return place;
+  }
+  void grow() {
+    NSXMLIndexList<Name> old(2 * _table.size());
+    old.swap(_table);
+    WorkPacer pacer;
+    for (const Name& each : old) {
+      pacer.turn();
+      if (each.name) _table[placeOf(_table, each.name)] = each;
+    }
+  }
+
+  NSXMLIndexList<Name> _table;
+  uint32_t _nameCount = 0;
+  NSXMLIndexList<NSXMLNode*> _arrived;
+  NSXMLIndexList<uint32_t> _numbers;  // of the names of those nodes
+};
+
+std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::Maker::index() {
+  WorkPacer pacer;
+  NSXMLIndexList<uint32_t> next(_nameCount);  // by number: where the name's next node goes
+  for (const Name& each : _table) {
+    if (each.name) next[each.begin] = each.end;
+  }
+  uint32_t sum = 0;
+  for (uint32_t& each : next) {
+    pacer.turn();
+    const uint32_t count = each;
+    each = sum;
+    sum += count;
+  }
+  for (Name& each : _table) {
+    pacer.turn();
+    if (!each.name) continue;
+    each.begin = next[each.begin];
+    each.end += each.begin;
+  }
+  std::unique_ptr<NSXMLNameIndex> made(new NSXMLNameIndex);
+  made->_nodes.resize(_arrived.size());
+  for (size_t i = 0; i < _arrived.size(); ++i) {
+    pacer.turn();
+    made->_nodes[next[_numbers[i]]++] = _arrived[i];
+  }
+  made->_table = std::move(_table);
+  return made;
+}
+
+std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofElements(const NSXMLNode* root) {
+  Maker maker;
+  WorkPacer pacer;
+  for (const NSXMLNode* node = root; node; node = node->nextNode()) {
+    pacer.turn();
+    if (node->kind() == Kind::Element) maker.add(node);
+  }
+  return maker.index();
+}
+
+std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofAttributes(const NSXMLNode* root) {
+  Maker maker;
+  WorkPacer pacer;
+  for (const NSXMLNode* node = root; node; node = node->nextNode()) {
+    pacer.turn();
+    const auto* element = dyn_cast<NSXMLElement>(node);
+    if (!element) continue;
+    for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
+         attribute = NSXMLElement::nextAttribute(attribute)) {
+      pacer.turn();
+      maker.add(attribute);
+    }
+  }
+  return maker.index();
+}
+
+NSXMLNodeSpan NSXMLNameIndex::nodes(const NSXMLExpandedName* name) const {
+  const Name& found = _table[placeOf(_table, name)];
+  return NSXMLNodeSpan(_nodes).subspan(found.begin, found.end - found.begin);
+}
+
+NSXMLNodeSpan NSXMLNameIndex::between(NSXMLNodeSpan nodes, const NSXMLNode* first,
+                                      const NSXMLNode* stop) {
+  const auto placeOf = [](NSXMLNodeSpan among, const NSXMLNode* node) {
+    const auto isBefore = [](const NSXMLNode* a, uint32_t number) {
+      return a->orderNumber() < number;
+    };
+    const auto found = std::lower_bound(among.begin(), among.end(), node->orderNumber(), isBefore);
+    return static_cast<size_t>(found - among.begin());
+  };
+  const NSXMLNodeSpan rest = nodes.subspan(placeOf(nodes, first));
+  return stop ? rest.first(placeOf(rest, stop)) : rest;
+}
+
+NSXMLNodeSpan NSXMLNameIndex::inside(NSXMLNodeSpan nodes, const NSXMLNode* node) {
+  if (node->kind() != Kind::Element && node->kind() != Kind::Document) return {};
+  const NSXMLNodeSpan found = between(nodes, node, NSXMLTree::endOfSubtree(node));
+  return !found.empty() && found.front() == node ? found.subspan(1) : found;
+}
+
+}  // namespace xquery

@@ -1,0 +1,65 @@
+// The elements of a tree, or its attributes, by expanded name, each name's in document order.
+//
+//   table   name -> end of its nodes, which begin where those of the name before it end
+//   nodes   a a a a b b c c c ...       one array, name by name
+//
+// An index is made in one pass and never changes. It is of the tree as it was: whoever uses it sees
+// to it that the tree has not changed (TreeIndexes.h). The pass looks at limits; one that is ended
+// leaves nothing behind.
+//
+// All names are indexed at once: the pass costs little more than a walk for one of them, and a name
+// that the tree does not have is known to be missing without an entry of its own.
+#pragma once
+
+#include "xquery/XMLNode.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <span>
+#include <vector>
+
+namespace xquery {
+
+using NSXMLNodeSpan = std::span<NSXMLNode* const>;
+
+// A list that counts towards the memory ceiling.
+template <class T>
+using NSXMLIndexList = std::vector<T, ValueAllocator<T>>;
+
+class NSXMLNameIndex {
+ public:
+  // Of everything under the root of a tree whose order numbers are good.
+  [[nodiscard]] static std::unique_ptr<const NSXMLNameIndex> ofElements(const NSXMLNode* root);
+  [[nodiscard]] static std::unique_ptr<const NSXMLNameIndex> ofAttributes(const NSXMLNode* root);
+  // What making one takes at most while it is made, for a tree of so many nodes.
+  static size_t mostBytes(uint64_t nodes) { return nodes * bytesPerNode; }
+
+  // All nodes of this name.
+  NSXMLNodeSpan nodes(const NSXMLExpandedName* name) const;
+  // Of nodes in document order those from `first` on that come before `stop`, which is null for the
+  // end of the tree. The attributes of a node come after it and before its children.
+  static NSXMLNodeSpan between(NSXMLNodeSpan nodes, const NSXMLNode* first, const NSXMLNode* stop);
+  // Those inside a node: descendants, or attributes of its own and of its descendants.
+  static NSXMLNodeSpan inside(NSXMLNodeSpan nodes, const NSXMLNode* node);
+
+ private:
+  class Maker;
+  struct Name {
+    const NSXMLExpandedName* name = nullptr;  // the tree holds it
+    uint32_t begin = 0;
+    uint32_t end = 0;
+  };
+  // The list of nodes and that of their names, each once more while it grows, and the result.
+  static constexpr size_t bytesPerNode =
+      3 * (sizeof(NSXMLNode*) + sizeof(uint32_t)) + sizeof(NSXMLNode*);
+
+  NSXMLNameIndex() = default;
+  // The name's own place, or the empty one where it belongs.
+  static size_t placeOf(const NSXMLIndexList<Name>& table, const NSXMLExpandedName* name);
+
+  NSXMLIndexList<Name> _table;  // 2^n places, at most half of them taken
+  NSXMLIndexList<NSXMLNode*> _nodes;
+};
+
+}  // namespace xquery

@@ -1,0 +1,174 @@
+#include "Platform/Tree/TreeIndexes.h"
+
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+
+#include <new>
+
+namespace xquery {
+
+namespace {
+
+// Whether a large part of what may still be taken is left when so much is.
+bool hasRoomFor(size_t bytes) {
+  constexpr size_t part = 2;
+  return workMeter.valueBytes + static_cast<int64_t>(part * bytes) <= workMeter.mostValueBytes;
+}
+
+uint32_t numberOfLast(const NSXMLNode* root) {
+  WorkPacer pacer;
+  const NSXMLNode* last = root;
+  while (const NSXMLNode* child = last->lastChild()) {
+    pacer.turn();
+    last = child;
+  }
+  return last->orderNumber();
+}
+
+}  // namespace
+
+// --- life ----------------------------------------------------------------------------------------
+
+NSXMLIndexesRef::NSXMLIndexesRef(NSXMLTreeIndexes* indexes) : _indexes(indexes) {
+  if (_indexes) _indexes->retain();
+}
+
+NSXMLIndexesRef::~NSXMLIndexesRef() {
+  if (_indexes) _indexes->release();
+}
+
+NSXMLTreeIndexes* NSXMLTreeIndexes::make(const NSXMLNode* node) {
+  const NSXMLNode* const root = node->rootNode();
+  const uint32_t lastNumber = numberOfLast(root);
+  if (lastNumber < fewNodes) return nullptr;
+  void* const memory = NSCounted::operator new(sizeof(NSXMLTreeIndexes));
+  return ::new (memory) NSXMLTreeIndexes(root, lastNumber);
+}
+
+NSXMLTreeIndexes::~NSXMLTreeIndexes() {
+  KeyPlace* place = _keys.load(std::memory_order_relaxed);
+  while (place) {
+    const std::unique_ptr<KeyPlace> owned(place);
+    place = owned->next;
+  }
+}
+
+void NSXMLTreeIndexes::release() {
+  if (_references.fetch_sub(1, std::memory_order_acq_rel) != 1) return;
+  this->~NSXMLTreeIndexes();
+  NSCounted::operator delete(this, sizeof(NSXMLTreeIndexes));
+}
+
+NSXMLIndexesRef NSXMLTreeIndexes::of(const NSXMLNode* node) {
+  NSXMLTree* const tree = NSXMLTree::of(node);
+  if (!tree->isOrderFresh()) return {};
+  NSXMLTreeIndexes* present = tree->_indexes.load(std::memory_order_acquire);
+  if (!present) {
+    NSXMLTreeIndexes* const made = make(node);
+    if (!made) return {};
+    if (tree->_indexes.compare_exchange_strong(present, made, std::memory_order_acq_rel,
+                                               std::memory_order_acquire)) {
+      present = made;
+    } else {
+      made->release();
+    }
+  }
+  return NSXMLIndexesRef(present);
+}
+
+bool NSXMLTreeIndexes::isOf(const NSXMLNode* node) const {
+  return NSXMLTree::of(node)->_indexes.load(std::memory_order_relaxed) == this;
+}
+
+void NSXMLTree::releaseIndexes() {
+  _indexes.exchange(nullptr, std::memory_order_relaxed)->release();
+}
+
+// --- finding and making --------------------------------------------------------------------------
+
+// The work is added up unless it is.
+bool NSXMLTreeIndexes::isWorth(std::atomic<uint64_t>& workDone, uint64_t work) const {
+  if (workDone.load(std::memory_order_relaxed) >= _lastNumber / 2) return true;
+  workDone.fetch_add(work, std::memory_order_relaxed);
+  return false;
+}
+
+// Null when another thread is at it, or when it would take too much.
+template <class Index, class Make>
+const Index* NSXMLTreeIndexes::makeOnce(Place<Index>& place, size_t bytes, Make make) {
+  if (const Index* present = place.index.load(std::memory_order_acquire)) return present;
+  if (!hasRoomFor(bytes)) return nullptr;
+  const std::unique_lock<std::mutex> guard(_making, std::try_to_lock);
+  if (!guard) return nullptr;
+  if (const Index* present = place.index.load(std::memory_order_acquire)) return present;
+  std::unique_ptr<const Index> made = make();
+  place.index.store(made.get(), std::memory_order_release);
+  return made.release();
+}
+
+const NSXMLNameIndex* NSXMLTreeIndexes::makeElements() {
+  return makeOnce(_elements, NSXMLNameIndex::mostBytes(_lastNumber),
+                  [this] { return NSXMLNameIndex::ofElements(_root); });
+}
+
+const NSXMLNameIndex* NSXMLTreeIndexes::elements(uint64_t work) {
+  const NSXMLNameIndex* const present = _elements.index.load(std::memory_order_acquire);
+  if (present || !isWorth(_elements.workDone, work)) return present;
+  return makeElements();
+}
+
+const NSXMLNameIndex* NSXMLTreeIndexes::attributes(uint64_t work) {
+  const NSXMLNameIndex* const present = _attributes.index.load(std::memory_order_acquire);
+  if (present || !isWorth(_attributes.workDone, work)) return present;
+  return makeOnce(_attributes, NSXMLNameIndex::mostBytes(_lastNumber),
+                  [this] { return NSXMLNameIndex::ofAttributes(_root); });
+}
+
+const NSXMLValueIndex* NSXMLTreeIndexes::values(const NSXMLValueKey& key, uint64_t work) {
+  KeyPlace* const place = placeOf(key);
+  if (!place) return nullptr;
+  const NSXMLValueIndex* const present = place->index.load(std::memory_order_acquire);
+  if (present || !isWorth(place->workDone, work)) return present;
+  const NSXMLNameIndex* const names = makeElements();
+  if (!names) return nullptr;
+  const NSXMLNodeSpan elements = names->nodes(key.element.get());
+  return makeOnce(*place, NSXMLValueIndex::likelyBytes(elements.size()),
+                  [&] { return NSXMLValueIndex::make(elements, key); });
+}
+
+NSXMLTreeIndexes::KeyPlace* NSXMLTreeIndexes::placeOf(const NSXMLValueKey& key) {
+  const auto present = [&]() -> KeyPlace* {
+    KeyPlace* place = _keys.load(std::memory_order_acquire);
+    while (place && !(place->key == key)) place = place->next;
+    return place;
+  };
+  if (KeyPlace* place = present()) return place;
+  const std::unique_lock<std::mutex> guard(_making, std::try_to_lock);
+  if (!guard) return nullptr;
+  if (KeyPlace* place = present()) return place;
+  if (_keyCount == mostKeys) return nullptr;
+  auto added = std::make_unique<KeyPlace>(key, _keys.load(std::memory_order_relaxed));
+  ++_keyCount;
+  _keys.store(added.get(), std::memory_order_release);
+  return added.release();
+}
+
+// --- walks ---------------------------------------------------------------------------------------
+
+std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLExpandedName* name,
+                                                      const NSXMLNode* first,
+                                                      const NSXMLNode* stop) {
+  if (!NSXMLTree::of(first)->isOrderFresh()) return std::nullopt;
+  const uint32_t number = first->orderNumber();
+  if (stop && stop->orderNumber() - number < NSXMLTreeIndexes::fewNodes) return std::nullopt;
+  NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(first);
+  if (!indexes) return std::nullopt;
+  const uint32_t end = stop ? stop->orderNumber() : indexes->lastNumber() + 1;
+  if (end - number < NSXMLTreeIndexes::fewNodes) return std::nullopt;
+  const NSXMLNameIndex* const elements = indexes->elements(end - number);
+  if (!elements) return std::nullopt;
+  return NSXMLIndexedNodes{std::move(indexes),
+                           NSXMLNameIndex::between(elements->nodes(name), first, stop)};
+}
+
+}  // namespace xquery

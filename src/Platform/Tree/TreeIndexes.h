@@ -1,0 +1,136 @@
+// The indexes of a tree: names of elements, names of attributes, values by key.
+//
+// They belong to the tree, for whoever reads it, and go when it changes or is freed. What asks for
+// one may be one of several threads, each of which evaluates something of its own; what changes the
+// tree is alone with it.
+//
+//   when      An index costs about as much as the walk that it replaces. So work that an index
+//   would
+//             have saved is added up, and when it comes to half a walk through the tree, whoever
+//             asks next makes the index: a document that is asked once is walked once, and asking
+//             never costs much more than twice what it would with what comes later known.
+//   who       One thread makes it; others walk meanwhile, so that nobody waits. An index that is
+//             made is published by one pointer and never changes.
+//   limits    Making one looks at deadline and flag, and what it takes counts towards the ceiling
+//   of
+//             the evaluation that makes it. One that would take much of what is left below the
+//             ceiling is not made: the evaluation would have gone on without it.
+//   changes   The tree lets go of all of its indexes at any change of it. Who still has a reference
+//             to them sees the tree as it was, and asks `isOf` whether it still is.
+//
+// Trees with several roots, trees whose order numbers are not good, as those under construction,
+// and small trees have none.
+#pragma once
+
+#include "Platform/Tree/NameIndex.h"
+#include "Platform/Tree/ValueIndex.h"
+
+#include <atomic>
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <utility>
+
+namespace xquery {
+
+class NSXMLTreeIndexes;
+
+// A count of the indexes of a tree, or null. The nodes in them live as long as their tree.
+class NSXMLIndexesRef {
+ public:
+  NSXMLIndexesRef() = default;
+  explicit NSXMLIndexesRef(NSXMLTreeIndexes* indexes);
+  NSXMLIndexesRef(const NSXMLIndexesRef& other) : NSXMLIndexesRef(other._indexes) {}
+  NSXMLIndexesRef(NSXMLIndexesRef&& other) noexcept
+      : _indexes(std::exchange(other._indexes, nullptr)) {}
+  NSXMLIndexesRef& operator=(NSXMLIndexesRef other) noexcept {
+    std::swap(_indexes, other._indexes);
+    return *this;
+  }
+  ~NSXMLIndexesRef();
+  NSXMLTreeIndexes* operator->() const { return _indexes; }
+  explicit operator bool() const { return _indexes != nullptr; }
+
+ private:
+  NSXMLTreeIndexes* _indexes = nullptr;
+};
+
+class NSXMLTreeIndexes {
+ public:
+  // A walk through fewer nodes is as quick as looking for them.
+  static constexpr uint32_t fewNodes = 256;
+  // More keys than these have no index: a host may ask one document ever new questions.
+  static constexpr uint32_t mostKeys = 64;
+
+  // Those of the node's tree, to be filled on demand; null for a tree that has none.
+  [[nodiscard]] static NSXMLIndexesRef of(const NSXMLNode* node);
+  // Whether they are those of the node's tree as it is now.
+  bool isOf(const NSXMLNode* node) const;
+
+  // Each answers the index if there is one, or if it is worth making now; null for: walk. `work` is
+  // how many nodes that walk will meet.
+  const NSXMLNameIndex* elements(uint64_t work);
+  const NSXMLNameIndex* attributes(uint64_t work);
+  // `work` includes the way from each element to its values.
+  const NSXMLValueIndex* values(const NSXMLValueKey& key, uint64_t work);
+
+  // Of the last node.
+  uint32_t lastNumber() const { return _lastNumber; }
+
+ private:
+  template <class Index>
+  struct Place {
+    std::atomic<uint64_t> workDone = 0;
+    std::atomic<const Index*> index = nullptr;
+
+    ~Place() { delete index.load(std::memory_order_relaxed); }
+  };
+  struct KeyPlace : Place<NSXMLValueIndex> {
+    KeyPlace(const NSXMLValueKey& ofKey, KeyPlace* others) : key(ofKey), next(others) {}
+    const NSXMLValueKey key;
+    KeyPlace* const next;
+  };
+
+  NSXMLTreeIndexes(const NSXMLNode* root, uint32_t lastNumber)
+      : _root(root), _lastNumber(lastNumber) {}
+  ~NSXMLTreeIndexes();
+  NSXMLTreeIndexes(const NSXMLTreeIndexes&) = delete;
+  NSXMLTreeIndexes& operator=(const NSXMLTreeIndexes&) = delete;
+
+  static NSXMLTreeIndexes* make(const NSXMLNode* node);
+  void retain() { _references.fetch_add(1, std::memory_order_relaxed); }
+  void release();
+  friend class NSXMLIndexesRef;
+  friend class NSXMLTree;
+
+  bool isWorth(std::atomic<uint64_t>& workDone, uint64_t work) const;
+  template <class Index, class Make>
+  const Index* makeOnce(Place<Index>& place, size_t bytes, Make make);
+  const NSXMLNameIndex* makeElements();
+  KeyPlace* placeOf(const NSXMLValueKey& key);
+
+  std::atomic<uint32_t> _references = 1;
+  uint32_t _keyCount = 0;
+  const NSXMLNode* const _root;
+  const uint32_t _lastNumber;
+  std::mutex _making;
+  Place<NSXMLNameIndex> _elements;
+  Place<NSXMLNameIndex> _attributes;
+  std::atomic<KeyPlace*> _keys = nullptr;  // added in front, none taken out
+};
+
+// Nodes that an index knows, held with it: what changes the tree meanwhile does not change them.
+struct NSXMLIndexedNodes {
+  NSXMLIndexesRef indexes;
+  NSXMLNodeSpan nodes;
+};
+
+// The elements of the name that a walk in document order meets from `first` on before `stop`, which
+// is null for the end of the tree; none for: walk.
+[[nodiscard]] std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLExpandedName* name,
+                                                                    const NSXMLNode* first,
+                                                                    const NSXMLNode* stop);
+
+}  // namespace xquery

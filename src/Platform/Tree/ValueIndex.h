@@ -1,0 +1,65 @@
+// The elements of one name by a value that belongs to them: an attribute of their own, the text of
+// a child, an attribute of a grandchild and so on.
+//
+//   for item, seller/@person      <item><seller person="p1"/><seller person="p2"/></item>
+//                                 is found by "p1" and by "p2"
+//
+// A value is the string value of the node that the key leads to; texts are the same when their
+// units are. An element may have several values, one of them twice, or none: it is found once by
+// each. Texts are not copied: a value is known by the first node that has it.
+//
+// As a name index, it is made in one pass, never changes and is of the tree as it was.
+#pragma once
+
+#include "Platform/Tree/NameIndex.h"
+
+#include <vector>
+
+namespace xquery {
+
+// Which elements, and the way from each to its values.
+struct NSXMLValueKey {
+  NSXMLExpandedNameRef element;
+  std::vector<NSXMLExpandedNameRef> children;  // the names of the steps down; none: the element
+  NSXMLExpandedNameRef attribute;  // of what the steps lead to; null for its own string value
+
+  friend bool operator==(const NSXMLValueKey& a, const NSXMLValueKey& b);
+};
+
+class NSXMLValueIndex {
+ public:
+  // The elements that the key names, in document order.
+  [[nodiscard]] static std::unique_ptr<const NSXMLValueIndex> make(NSXMLNodeSpan elements,
+                                                                   const NSXMLValueKey& key);
+  // What making one is likely to take at most, for so many elements: few have several values.
+  static size_t likelyBytes(size_t elements) { return elements * bytesPerElement; }
+
+  // The elements that have the value, in document order.
+  NSXMLNodeSpan nodes(NSStringView value) const;
+  // How many different values there are.
+  size_t valueCount() const { return _values.size(); }
+
+ private:
+  class Maker;
+  struct KnownValue {
+    const NSXMLNode* first;  // with this value
+    uint32_t hash;
+    uint32_t end;  // of its elements, which begin where those of the value before it end
+  };
+  static constexpr uint32_t free = UINT32_MAX;
+  // The lists of values, of the elements and of what is noted of both while they grow; the table.
+  static constexpr size_t bytesPerElement =
+      3 * (sizeof(KnownValue) + 2 * sizeof(NSXMLNode*) + sizeof(uint32_t)) + sizeof(NSXMLNode*) +
+      6 * sizeof(uint32_t);
+
+  NSXMLValueIndex() = default;
+  // The place of the value, or the free one where it belongs.
+  size_t placeOf(NSStringView value, uint32_t hash) const;
+  void growTable();
+
+  NSXMLIndexList<uint32_t> _table;  // numbers of values; 2^n places, at most half of them taken
+  NSXMLIndexList<KnownValue> _values;
+  NSXMLIndexList<NSXMLNode*> _nodes;
+};
+
+}  // namespace xquery

@@ -1,0 +1,503 @@
+// Indexes of trees answer what plain walks find, over generated documents that change in between,
+// under limits and from several threads.
+#include "Platform/Base/LookCounter.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/TreeIndexes.h"
+#include "Platform/Tree/XMLTestSupport.h"
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <functional>
+#include <map>
+#include <random>
+#include <set>
+#include <string>
+#include <thread>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+using Nodes = std::vector<NSXMLNode*>;
+
+Nodes listed(NSXMLNodeSpan nodes) {
+  return {nodes.begin(), nodes.end()};
+}
+
+// Elements a, b, c in two namespaces, nested to any depth, with attributes whose values repeat.
+class Records {
+ public:
+  explicit Records(uint32_t seed) : _random(seed) {}
+  std::string text(size_t count) {
+    std::string out = "<r xmlns:n='urn:n'>";
+    std::vector<std::string> open;
+    for (size_t i = 0; i < count; ++i) {
+      const std::string name = pick({"a", "b", "c", "n:a"});
+      out += "<" + name;
+      if (_random() % 2) out += " x='" + value() + "'";
+      if (_random() % 4 == 0) out += " n:x='" + value() + "'";
+      out += ">" + pick({"", "", "1", "2", "caf\xC3\xA9", "<!--c-->3"});
+      open.push_back(name);
+      while (!open.empty() && (_random() % 2 || open.size() > 6)) {
+        out += pick({"", "2", "\xF0\x9F\x98\x80"}) + "</" + open.back() + ">";
+        open.pop_back();
+      }
+    }
+    for (; !open.empty(); open.pop_back()) out += "</" + open.back() + ">";
+    return out + "</r>";
+  }
+  std::string value() { return std::to_string(_random() % 9); }
+  size_t below(size_t bound) { return _random() % bound; }
+
+ private:
+  std::string pick(std::initializer_list<const char*> choices) {
+    return choices.begin()[_random() % choices.size()];
+  }
+  std::mt19937 _random;
+};
+
+const NSXMLExpandedNameRef& name(const std::string& local, const std::string& URI = "") {
+  static std::map<std::pair<std::string, std::string>, NSXMLExpandedNameRef> names;
+  auto& found = names[{local, URI}];
+  if (!found) found = NSXMLExpandedNameRef(A(URI), A(local));
+  return found;
+}
+
+// What a walk from `first` to `stop` finds.
+Nodes walked(Kind kind, const NSXMLExpandedName* wanted, NSXMLNode* first, const NSXMLNode* stop) {
+  Nodes found;
+  for (NSXMLNode* node = first; node && node != stop; node = node->nextNode()) {
+    if (kind == Kind::Element && node->expandedName() == wanted) found.push_back(node);
+    auto* element = dyn_cast<NSXMLElement>(node);
+    if (kind == Kind::Element || !element) continue;
+    for (NSXMLNode* each = element->firstAttribute(); each;
+         each = NSXMLElement::nextAttribute(each)) {
+      if (each->expandedName() == wanted) found.push_back(each);
+    }
+  }
+  return found;
+}
+
+Nodes everyNode(NSXMLNode* root) {
+  Nodes all;
+  for (NSXMLNode* node = root; node; node = node->nextNode()) all.push_back(node);
+  return all;
+}
+
+const NSXMLExpandedName* const someNames[] = {name("a").get(),
+                                              name("b").get(),
+                                              name("r").get(),
+                                              name("x").get(),
+                                              name("a", "urn:n").get(),
+                                              name("x", "urn:n").get(),
+                                              name("a", "urn:other").get()};
+
+class Ceiling {
+ public:
+  explicit Ceiling(int64_t bytes) : _outer(workMeter.mostValueBytes) {
+    workMeter.mostValueBytes = workMeter.valueBytes + bytes;
+  }
+  ~Ceiling() { workMeter.mostValueBytes = _outer; }
+
+ private:
+  const int64_t _outer;
+};
+
+constexpr uint64_t wholeWalk = UINT32_MAX;
+
+// --- names ---------------------------------------------------------------------------------------
+
+TEST(XMLNameIndex, HasWhatAWalkFinds) {
+  for (uint32_t seed = 0; seed < 40; ++seed) {
+    const auto document = parsed(Records(seed).text(seed * 10));
+    const auto elements = NSXMLNameIndex::ofElements(document.get());
+    const auto attributes = NSXMLNameIndex::ofAttributes(document.get());
+    const Nodes all = everyNode(document.get());
+    std::mt19937 random(seed);
+    for (const NSXMLExpandedName* each : someNames) {
+      for (const Kind kind : {Kind::Element, Kind::Attribute}) {
+        const auto& index = kind == Kind::Element ? *elements : *attributes;
+        ASSERT_EQ(listed(index.nodes(each)), walked(kind, each, document.get(), nullptr));
+        for (int turn = 0; turn < 5; ++turn) {
+          const size_t from = random() % all.size();
+          const size_t to = from + random() % (all.size() - from);
+          ASSERT_EQ(listed(NSXMLNameIndex::between(index.nodes(each), all[from], all[to])),
+                    walked(kind, each, all[from], all[to]));
+          const NSXMLNode* end = NSXMLTree::endOfSubtree(all[from]);
+          Nodes inside = walked(kind, each, all[from], end);
+          if (!inside.empty() && inside.front() == all[from]) inside.erase(inside.begin());
+          ASSERT_EQ(listed(NSXMLNameIndex::inside(index.nodes(each), all[from])), inside);
+        }
+      }
+    }
+  }
+}
+
+TEST(XMLNameIndex, HoldsAsManyNamesAsTheTreeHas) {
+  std::string text = "<r>";
+  for (int i = 0; i < 3000; ++i) text += "<e" + std::to_string(i % 1000) + "/>";
+  const auto document = parsed(text + "</r>");
+  const auto index = NSXMLNameIndex::ofElements(document.get());
+  for (int i = 0; i < 1000; ++i) {
+    const NSXMLExpandedNameRef each({}, A("e" + std::to_string(i)));
+    ASSERT_EQ(listed(index->nodes(each.get())),
+              walked(Kind::Element, each.get(), document.get(), nullptr));
+  }
+}
+
+// --- values --------------------------------------------------------------------------------------
+
+Nodes valuesOf(NSXMLNode* element, const NSXMLValueKey& key) {
+  Nodes at{element};
+  for (const auto& step : key.children) {
+    Nodes below;
+    for (const NSXMLNode* node : at) {
+      for (NSXMLNode* child = node->firstChild(); child; child = child->nextSibling()) {
+        if (child->kind() == Kind::Element && child->expandedName() == step.get()) {
+          below.push_back(child);
+        }
+      }
+    }
+    at.swap(below);
+  }
+  if (!key.attribute) return at;
+  Nodes attributes;
+  for (const NSXMLNode* node : at) {
+    for (NSXMLNode* each = cast<NSXMLElement>(node)->firstAttribute(); each;
+         each = NSXMLElement::nextAttribute(each)) {
+      if (each->expandedName() == key.attribute.get()) attributes.push_back(each);
+    }
+  }
+  return attributes;
+}
+
+std::map<std::u16string, Nodes> nodesByValue(NSXMLNode* root, const NSXMLValueKey& key) {
+  std::map<std::u16string, Nodes> byValue;
+  for (NSXMLNode* element : walked(Kind::Element, key.element.get(), root, nullptr)) {
+    for (const NSXMLNode* value : valuesOf(element, key)) {
+      Nodes& nodes = byValue[value->stringValue()->view().utf16()];
+      if (nodes.empty() || nodes.back() != element) nodes.push_back(element);
+    }
+  }
+  return byValue;
+}
+
+const NSXMLValueKey someKeys[] = {
+    {name("a"), {}, name("x")},
+    {name("a"), {}, name("x", "urn:n")},
+    {name("a"), {}, {}},
+    {name("b"), {name("a")}, {}},
+    {name("r"), {name("a"), name("b")}, name("x")},
+    {name("a", "urn:n"), {name("a"), name("b"), name("c")}, {}},
+    {name("none"), {name("a")}, {}},
+};
+
+void expectValues(const NSXMLValueIndex& index, NSXMLNode* root, const NSXMLValueKey& key) {
+  const auto expected = nodesByValue(root, key);
+  EXPECT_EQ(index.valueCount(), expected.size());
+  for (const auto& [value, nodes] : expected) {
+    const NSStringView wide(value.data(), static_cast<uint32_t>(value.size()));
+    EXPECT_EQ(listed(index.nodes(wide)), nodes) << wide.utf8();
+    EXPECT_EQ(listed(index.nodes(NSString::stringWithView(wide)->view())), nodes) << wide.utf8();
+  }
+  EXPECT_TRUE(index.nodes(A("no such value")).empty());
+}
+
+TEST(XMLValueIndex, HasWhatAWalkFinds) {
+  for (uint32_t seed = 0; seed < 20; ++seed) {
+    const auto document = parsed(Records(seed).text(seed * 20));
+    const auto names = NSXMLNameIndex::ofElements(document.get());
+    for (const NSXMLValueKey& key : someKeys) {
+      const auto index = NSXMLValueIndex::make(names->nodes(key.element.get()), key);
+      expectValues(*index, document.get(), key);
+    }
+  }
+}
+
+TEST(XMLValueIndex, FindsAnElementOnceByEachOfItsValues) {
+  const auto document = parsed("<r><i><s p='1'/><s p='2'/><s p='1'/></i><i><s p='2'/><s/></i></r>");
+  const NSXMLValueKey key{name("i"), {name("s")}, name("p")};
+  const auto names = NSXMLNameIndex::ofElements(document.get());
+  const auto index = NSXMLValueIndex::make(names->nodes(key.element.get()), key);
+  NSXMLNode* first = document->rootElement()->firstChild();
+  EXPECT_EQ(listed(index->nodes(A("1"))), Nodes{first});
+  EXPECT_EQ(listed(index->nodes(A("2"))), (Nodes{first, first->nextSibling()}));
+  EXPECT_TRUE(index->nodes(A("")).empty());
+}
+
+// --- when they are made --------------------------------------------------------------------------
+
+std::optional<Nodes> indexed(const NSXMLExpandedName* wanted, const NSXMLNode* first,
+                             const NSXMLNode* stop = nullptr) {
+  const auto found = NSXMLIndexedElements(wanted, first, stop);
+  if (!found) return std::nullopt;
+  return listed(found->nodes);
+}
+
+TEST(XMLTreeIndexes, AreMadeWhenATreeIsAskedASecondTime) {
+  const auto document = parsed(Records(1).text(500));
+  NSXMLNode* root = document->rootElement();
+  EXPECT_FALSE(indexed(name("a").get(), root));
+  EXPECT_EQ(indexed(name("a").get(), root), walked(Kind::Element, name("a").get(), root, nullptr));
+  EXPECT_EQ(indexed(name("none").get(), root), Nodes());
+}
+
+TEST(XMLTreeIndexes, AreMadeForPartsWhenTheseComeToHalfTheTree) {
+  std::string text = "<r>";
+  for (int part = 0; part < 10; ++part) {
+    text += "<p>";
+    for (int i = 0; i < 300; ++i) text += "<e/>";
+    text += "</p>";
+  }
+  const auto document = parsed(text + "</r>");
+  int turn = 0;
+  for (NSXMLNode* part = document->rootElement()->firstChild(); part->nextSibling();
+       part = part->nextSibling(), ++turn) {
+    const auto found = indexed(name("e").get(), part->firstChild(), part->nextSibling());
+    EXPECT_EQ(found.has_value(), turn >= 6) << turn;
+    if (found) {
+      EXPECT_EQ(found->size(), 300u);
+    }
+  }
+}
+
+TEST(XMLTreeIndexes, AreNotForSmallTreesAndSmallParts) {
+  const auto small = parsed("<r><a/><a/></r>");
+  const auto large = parsed(Records(2).text(500));
+  for (int turn = 0; turn < 4; ++turn) {
+    EXPECT_FALSE(indexed(name("a").get(), small.get()));
+    static_cast<void>(indexed(name("a").get(), large.get()));
+    NSXMLNode* first = large->rootElement()->firstChild();
+    EXPECT_FALSE(indexed(name("a").get(), first, first->nextNode()));
+  }
+}
+
+TEST(XMLTreeIndexes, AreNotForTreesOfSeveralRoots) {
+  const auto document = parsed(Records(3).text(500));
+  const Ref<NSXMLNode> part = document->rootElement()->firstChild();
+  part->detach();
+  for (int turn = 0; turn < 4; ++turn) EXPECT_FALSE(NSXMLTreeIndexes::of(document.get()));
+}
+
+TEST(XMLTreeIndexes, KnowTheValuesOfAsManyKeysAsTheyMay) {
+  const auto document = parsed(Records(4).text(500));
+  const NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(document.get());
+  for (uint32_t i = 0; i <= NSXMLTreeIndexes::mostKeys; ++i) {
+    const NSXMLExpandedNameRef attribute({}, A("x" + std::to_string(i)));
+    const NSXMLValueKey key{name("a"), {}, attribute};
+    EXPECT_FALSE(indexes->values(key, wholeWalk)) << i;
+    EXPECT_EQ(indexes->values(key, wholeWalk) != nullptr, i < NSXMLTreeIndexes::mostKeys) << i;
+  }
+}
+
+// --- changes -------------------------------------------------------------------------------------
+
+NSXMLIndexesRef filled(NSXMLNode* node) {
+  // Numbers are assigned anew when somebody compares.
+  const NSXMLNode* root = node->rootNode();
+  static_cast<void>(NSXMLNode::compareOrder(root, root->firstChild()));
+  NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(node);
+  EXPECT_TRUE(indexes);
+  for (int turn = 0; indexes && turn < 2; ++turn) {
+    static_cast<void>(indexes->elements(wholeWalk));
+    static_cast<void>(indexes->attributes(wholeWalk));
+    for (const NSXMLValueKey& key : someKeys) static_cast<void>(indexes->values(key, wholeWalk));
+  }
+  return indexes;
+}
+
+void expectLikeWalks(NSXMLNode* root) {
+  const NSXMLIndexesRef indexes = filled(root->firstChild());
+  ASSERT_TRUE(indexes && indexes->isOf(root));
+  for (const NSXMLExpandedName* each : someNames) {
+    ASSERT_EQ(listed(indexes->elements(0)->nodes(each)),
+              walked(Kind::Element, each, root, nullptr));
+    ASSERT_EQ(listed(indexes->attributes(0)->nodes(each)),
+              walked(Kind::Attribute, each, root, nullptr));
+  }
+  for (const NSXMLValueKey& key : someKeys) expectValues(*indexes->values(key, 0), root, key);
+}
+
+TEST(XMLTreeIndexes, GoAtAnyChangeOfTheTree) {
+  const auto element = [](std::string_view local) {
+    return NSXMLElement::elementWithName(A(local));
+  };
+  using Change = std::function<void(NSXMLElement*)>;
+  const std::pair<const char*, Change> changes[] = {
+      {"a child", [&](NSXMLElement* r) { r->addChild(element("a")); }},
+      {"a child in front", [&](NSXMLElement* r) { r->insertChild(element("a"), 0); }},
+      {"a text", [](NSXMLElement* r) { r->addChild(NSXMLNode::textWithStringValue(A("t"))); }},
+      {"an attribute",
+       [](NSXMLElement* r) { r->addAttribute(NSXMLNode::attributeWithName(A("x"), A("1"))); }},
+      {"no attribute", [](NSXMLElement* r) { r->removeAttributeForName(A("id")); }},
+      {"a value", [](NSXMLElement* r) { r->firstAttribute()->setStringValue(A("2")); }},
+      {"a new content", [](NSXMLElement* r) { r->lastChild()->setStringValue(A("2")); }},
+      {"a larger tree",
+       [](NSXMLElement* r) {
+         const auto other = parsed(Records(7).text(600));
+         const Ref<NSXMLNode> root = other->rootElement();
+         root->detach();
+         r->addChild(Ref<NSXMLNode>(root));
+       }},
+  };
+  for (const auto& [what, change] : changes) {
+    const auto document = parsed("<q id='1'>" + Records(5).text(300) + "</q>");
+    const NSXMLIndexesRef indexes = filled(document.get());
+    ASSERT_TRUE(indexes->isOf(document.get())) << what;
+    change(document->rootElement());
+    EXPECT_FALSE(indexes->isOf(document.get())) << what;
+  }
+}
+
+TEST(XMLTreeIndexes, GoWhenTheTreeMovesIntoAnother) {
+  const auto root = NSXMLElement::elementWithName(A("root"));
+  const Ref<NSXMLNode> moved = parsed(Records(5).text(300))->rootElement()->copy();
+  const NSXMLIndexesRef indexes = filled(moved.get());
+  EXPECT_TRUE(indexes->isOf(moved.get()));
+  EXPECT_TRUE(root->addChild(moved));
+  EXPECT_FALSE(indexes->isOf(moved.get()));
+  expectLikeWalks(root.get());
+}
+
+TEST(XMLTreeIndexes, AreThoseOfTheTreeAsItIsAfterEachChange) {
+  Records random(6);
+  const Ref<NSXMLNode> root = parsed(random.text(300))->rootElement()->copy();
+  for (int turn = 0; turn < 60; ++turn) {
+    const Nodes all = everyNode(root.get());
+    NSXMLNode* node = all[random.below(all.size())];
+    while (node->kind() != Kind::Element) node = node->parent();
+    auto* element = cast<NSXMLElement>(node);
+    switch (random.below(4)) {
+      case 0:
+        element->insertChild(parsed(random.text(3))->rootElement()->copy(),
+                             static_cast<uint32_t>(random.below(3)));
+        break;
+      case 1:
+        if (element->firstAttribute()) element->firstAttribute()->setStringValue(A(random.value()));
+        break;
+      case 2:
+        element->addAttribute(NSXMLNode::attributeWithName(A("x"), A(random.value())));
+        break;
+      default:
+        if (element->firstChild() && element->firstChild()->kind() == Kind::Text) {
+          element->firstChild()->setStringValue(A(random.value()));
+        }
+    }
+    expectLikeWalks(root.get());
+    if (HasFatalFailure()) return;
+  }
+}
+
+TEST(XMLTreeIndexes, NodesThatSomebodyHoldsStayWhatTheyWereAtAChange) {
+  const auto document = parsed(Records(8).text(500));
+  NSXMLElement* root = document->rootElement();
+  const Nodes before = walked(Kind::Element, name("a").get(), root, nullptr);
+  static_cast<void>(indexed(name("a").get(), root));
+  const auto held = NSXMLIndexedElements(name("a").get(), root, nullptr);
+  root->insertChild(NSXMLElement::elementWithName(A("a")), 0);
+  ASSERT_TRUE(held);
+  EXPECT_EQ(listed(held->nodes), before);
+}
+
+// --- limits --------------------------------------------------------------------------------------
+
+TEST(XMLTreeIndexes, OneThatIsEndedLeavesNothingBehind) {
+  const auto document = parsed(Records(9).text(4000));
+  const NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(document.get());
+  const NSXMLValueKey key{name("a"), {}, {}};
+  static_cast<void>(indexes->elements(wholeWalk));
+  static_cast<void>(indexes->attributes(wholeWalk));
+  static_cast<void>(indexes->values(key, wholeWalk));
+  const std::function<bool()> makes[] = {
+      [&] { return indexes->attributes(0) != nullptr; },
+      [&] { return indexes->elements(0) != nullptr; },
+      [&] { return indexes->values(key, 0) != nullptr; },
+  };
+  for (const auto& make : makes) {
+    int looks = 0;
+    for (bool isMade = false; !isMade; ++looks) {
+      ASSERT_LT(looks, 10'000);
+      const int64_t before = workMeter.valueBytes;
+      const LookCounter watcher(looks);
+      try {
+        isMade = make();
+        ASSERT_TRUE(isMade);
+      } catch (const Ended&) {
+        ASSERT_EQ(workMeter.valueBytes, before) << looks;
+      }
+    }
+    EXPECT_GT(looks, 10);
+  }
+  expectLikeWalks(document.get());
+}
+
+TEST(XMLTreeIndexes, AreNotMadeWhereTheyWouldTakeMuchOfWhatIsLeft) {
+  const auto document = parsed(Records(10).text(4000));
+  const NSXMLNode* root = document->rootElement();
+  static_cast<void>(indexed(name("a").get(), root));
+  {
+    const Ceiling ceiling(100'000);
+    const int64_t before = workMeter.valueBytes;
+    EXPECT_FALSE(indexed(name("a").get(), root));
+    EXPECT_EQ(workMeter.valueBytes, before);
+    EXPECT_FALSE(workMeter.wasRefused);
+  }
+  EXPECT_TRUE(indexed(name("a").get(), root));
+}
+
+TEST(XMLTreeIndexes, CountTowardsTheCeilingUntilTheyGo) {
+  const int64_t atFirst = workMeter.valueBytes;
+  {
+    const auto document = parsed(Records(11).text(4000));
+    const int64_t ofTree = workMeter.valueBytes;
+    const size_t elements = walked(Kind::Element, name("a").get(), document.get(), nullptr).size();
+    static_cast<void>(filled(document.get()));
+    EXPECT_GT(workMeter.valueBytes - ofTree,
+              static_cast<int64_t>(elements * 4 * sizeof(NSXMLNode*)));
+    {
+      const Ref<NSXMLNode> text = NSXMLNode::textWithStringValue(A("x"));
+      document->rootElement()->addChild(text);
+    }
+    constexpr int64_t ofText = 128;
+    EXPECT_LE(workMeter.valueBytes - ofTree, ofText);
+    static_cast<void>(filled(document.get()));
+  }
+  EXPECT_EQ(workMeter.valueBytes, atFirst);
+}
+
+// --- threads -------------------------------------------------------------------------------------
+
+TEST(XMLTreeIndexesThreads, AskOneDocumentAtOnce) {
+  const NSXMLExpandedName* const a = name("a").get();
+  const NSXMLValueKey key{name("a"), {}, name("x")};
+  for (uint32_t seed = 0; seed < 4; ++seed) {
+    const auto document = parsed(Records(seed).text(1000));
+    NSXMLNode* const root = document->rootElement();
+    const Nodes expected = walked(Kind::Element, a, root, nullptr);
+    const Nodes ofValue = nodesByValue(root, key)[u"3"];
+    std::atomic<int> answers = 0;
+    const auto ask = [&] {
+      for (int turn = 0; turn < 20; ++turn) {
+        if (const auto found = indexed(a, root)) {
+          EXPECT_EQ(*found, expected);
+          ++answers;
+        }
+        const NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(root);
+        if (const auto* values = indexes->values(key, wholeWalk)) {
+          EXPECT_EQ(listed(values->nodes(A("3"))), ofValue);
+          ++answers;
+        }
+        std::this_thread::yield();
+      }
+    };
+    std::vector<std::thread> threads;
+    for (int i = 0; i < 4; ++i) threads.emplace_back(ask);
+    for (auto& thread : threads) thread.join();
+    EXPECT_GT(answers, 0);
+  }
+}
+
+}  // namespace
+}  // namespace xquery
