@@ -11,6 +11,7 @@
 
 #include "Expr/Paths/XQueryPath.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/TreeIndexes.h"
 #include "xquery/XMLNode.h"
 
 #include <vector>
@@ -34,8 +35,13 @@ NSXMLNode* XQueryLastInSubtree(NSXMLNode* node);
 // Visits `first` and each node after it in document order, up to (excluding) `stop`. Only the nodes
 // without children are counted, usually half of all: each way down ends at one, and a way
 // down of a million levels takes a few milliseconds.
+//
+// A visitor that can find its nodes without a walk may do so.
 template <class Visit>
 void XQueryWalkNodes(NSXMLNode* first, const NSXMLNode* stop, const Visit& visitor) {
+  if constexpr (requires { visitor.visitIndexed(first, stop); }) {
+    if (first && first != stop && visitor.visitIndexed(first, stop)) return;
+  }
   WorkPacer pacer;
   Visit visit = visitor;  // whose parts can then be in registers
   for (NSXMLNode* node = first; node && node != stop;) {
@@ -48,6 +54,34 @@ void XQueryWalkNodes(NSXMLNode* first, const NSXMLNode* stop, const Visit& visit
     }
   }
 }
+
+// Does something with the elements and attributes of a name and passes over all other nodes.
+template <class Act>
+class XQueryNamedVisit {
+ public:
+  XQueryNamedVisit(const NSXMLExpandedName* name, Act act) : _name(name), _act(act) {}
+
+  bool operator()(NSXMLNode* found) {
+    const bool isNamed = found->kind() == Kind::Element || found->kind() == Kind::Attribute;
+    return !isNamed || found->expandedName() != _name || _act(found);
+  }
+  // In place of a walk, which would meet no attributes.
+  bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
+    const auto indexed = NSXMLIndexedElements(_name, first, stop);
+    if (!indexed) return false;
+    WorkPacer pacer;
+    Act act = _act;
+    for (NSXMLNode* node : indexed->nodes) {
+      pacer.turn();
+      if (!act(node)) break;
+    }
+    return true;
+  }
+
+ private:
+  const NSXMLExpandedName* _name;
+  Act _act;
+};
 
 // The same without the ancestors of `stop` given, the outermost last.
 template <class Visit>

@@ -255,22 +255,20 @@ void XQueryAxisStep::enter(NSXMLNode* node, XQueryPathRun& run) const {
 void XQueryAxisStep::stream(int axis, NSXMLNode* node, XQueryPathRun& run) const {
   XQueryNodeTest test(_expr.get(), run);
   if (const NSXMLExpandedName* name = test.onlyName()) {
-    streamMatching(axis, node, run, [name](const NSXMLNode* found) {
-      const bool isNamed = found->kind() == Kind::Element || found->kind() == Kind::Attribute;
-      return isNamed && found->expandedName() == name;
-    });
+    streamMatching(axis, node, run, [name](auto act) { return XQueryNamedVisit(name, act); });
   } else {
-    streamMatching(axis, node, run,
-                   [&test](const NSXMLNode* found) { return test.matches(found); });
+    streamMatching(axis, node, run, [&test](auto act) {
+      return [&test, act](NSXMLNode* found) { return !test.matches(found) || act(found); };
+    });
   }
 }
 
-template <class Matches>
+// `visitOf` makes of what is to be done with a matching node a visitor of all nodes.
+template <class VisitOf>
 void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& run,
-                                    Matches matches) const {
+                                    VisitOf visitOf) const {
   const XQueryStep* next = _next.get();
-  const auto handOn = [matches, next, &run](NSXMLNode* found) {
-    if (!matches(found)) return true;
+  const auto handOn = [next, &run](NSXMLNode* found) {
     if (!next) {
       run.results.addNode(found, run.context);
       return true;
@@ -281,19 +279,19 @@ void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& ru
   };
   if (_gathersFirst) {
     std::vector<NSXMLNode*>& nodes = run.openNodeList();
-    XQueryWalkAxis(node, axis, [matches, &nodes](NSXMLNode* found) {
-      if (matches(found)) nodes.push_back(found);
-      return true;
-    });
+    XQueryWalkAxis(node, axis, visitOf([&nodes](NSXMLNode* found) {
+                     nodes.push_back(found);
+                     return true;
+                   }));
     for (NSXMLNode* found : nodes) {
       if (run.hasFailed) break;
       next->processNode(found, run);
     }
     run.closeNodeList();
   } else if (_trail != noTrail && !run.setsEveryFocus) {
-    run.trail(_trail).walk(node, axis, handOn);
+    run.trail(_trail).walk(node, axis, visitOf(handOn));
   } else {
-    XQueryWalkAxis(node, axis, handOn);
+    XQueryWalkAxis(node, axis, visitOf(handOn));
   }
   if (!next) run.results.setIsReversed(isReverse());
 }
@@ -336,14 +334,21 @@ size_t XQueryAxisStep::collect(int axis, NSXMLNode* node, std::vector<NSXMLNode*
     });
     return 1;
   }
-  const auto add = [&](NSXMLNode* found) {
-    if (test.matches(found)) nodes.push_back(found);
+  const auto walk = [&](auto visit) {
+    if (_trail != noTrail && !run.setsEveryFocus) {
+      run.trail(_trail).walk(node, axis, visit);
+    } else {
+      XQueryWalkAlongAxis(node, axis, visit);
+    }
+  };
+  const auto add = [&nodes](NSXMLNode* found) {
+    nodes.push_back(found);
     return true;
   };
-  if (_trail != noTrail && !run.setsEveryFocus) {
-    run.trail(_trail).walk(node, axis, add);
+  if (const NSXMLExpandedName* name = test.onlyName()) {
+    walk(XQueryNamedVisit(name, add));
   } else {
-    XQueryWalkAlongAxis(node, axis, add);
+    walk([&test, add](NSXMLNode* found) { return !test.matches(found) || add(found); });
   }
   return 0;
 }

@@ -136,8 +136,8 @@ class XQueryAxisStep : public XQueryStep {
 
   void enter(NSXMLNode* node, XQueryPathRun& run) const;
   void stream(int axis, NSXMLNode* node, XQueryPathRun& run) const;
-  template <class Matches>
-  void streamMatching(int axis, NSXMLNode* node, XQueryPathRun& run, Matches matches) const;
+  template <class VisitOf>
+  void streamMatching(int axis, NSXMLNode* node, XQueryPathRun& run, VisitOf visitOf) const;
   void filter(int axis, NSXMLNode* node, XQueryPathRun& run) const;
   size_t collect(int axis, NSXMLNode* node, std::vector<NSXMLNode*>& nodes,
                  XQueryPathRun& run) const;
