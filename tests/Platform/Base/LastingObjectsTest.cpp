@@ -20,7 +20,7 @@ Ref<NSNumber> number(bool lasting) {
   return NSNumber::numberWithLongLong(1);
 }
 
-#if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+#ifndef XQUERY_SANITIZED
 
 // More than any thread and the process keep ready.
 constexpr int manyNumbers = 100000;

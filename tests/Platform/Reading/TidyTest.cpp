@@ -167,7 +167,11 @@ TEST(TidyHostile, DeepNestingIsReadOrRefused) {
 
 TEST(TidyHostile, FarTooDeepNestingIsRefused) {
   for (const auto* tag : {"<div>", "<b>"}) {
-    EXPECT_EQ(outcome(repeated(tag, 2'000'000)), "HTML nested too deeply") << tag;
+    const std::string deep = outcome(repeated(tag, 2'000'000));
+#ifdef XQUERY_SANITIZED
+    if (deep == "HTML takes too much time") continue;  // there it may
+#endif
+    EXPECT_EQ(deep, "HTML nested too deeply") << tag;
   }
 }
 
