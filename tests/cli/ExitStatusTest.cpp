@@ -152,7 +152,11 @@ TEST(ExitStatus, HTMLThatIsRefusedIsThree) {
   const Outcome outcome = xquery({"--html", "-e", "1", "-"}, tags);
   EXPECT_EQ(outcome.status, 3);
   EXPECT_EQ(outcome.out, "");
+#ifdef XQUERY_SANITIZED
+  EXPECT_THAT(outcome.err, StartsWith("xquery: standard input: HTML "));  // time may be up first
+#else
   EXPECT_EQ(outcome.err, "xquery: standard input: HTML nested too deeply\n");
+#endif
   const Outcome missing = xquery({"--html", "-e", "1", "/nowhere/input.html"});
   EXPECT_EQ(missing.status, 3);
   EXPECT_EQ(missing.err, "xquery: /nowhere/input.html: No such file or directory\n");

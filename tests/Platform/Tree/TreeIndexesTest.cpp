@@ -405,6 +405,9 @@ TEST(XMLTreeIndexes, NodesThatSomebodyHoldsStayWhatTheyWereAtAChange) {
 
 TEST(XMLTreeIndexes, OneThatIsEndedLeavesNothingBehind) {
   const auto document = parsed(Records(9).text(4000));
+  // The expanded names of the tree are made when first asked for, and stay.
+  static_cast<void>(NSXMLNameIndex::ofElements(document.get()));
+  static_cast<void>(NSXMLNameIndex::ofAttributes(document.get()));
   const NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(document.get());
   const NSXMLValueKey key{name("a"), {}, {}};
   static_cast<void>(indexes->elements(wholeWalk));
@@ -448,6 +451,8 @@ TEST(XMLTreeIndexes, AreNotMadeWhereTheyWouldTakeMuchOfWhatIsLeft) {
 }
 
 TEST(XMLTreeIndexes, CountTowardsTheCeilingUntilTheyGo) {
+  // The names of these tests are made when first asked for, and stay.
+  static_cast<void>(filled(parsed(Records(11).text(4000)).get()));
   const int64_t atFirst = workMeter.valueBytes;
   {
     const auto document = parsed(Records(11).text(4000));
