@@ -126,9 +126,9 @@ void XQueryContextInternal::setBaseURI(const Ref<NSString>& URI, const NSXMLNode
   if (NSXMLTree::recordBaseURI(forNode, _baseURIOwner, _recordedBaseURI)) ++_baseURINodeCount;
 }
 
-Ref<NSString> XQueryContextInternal::baseURIForNode(const NSXMLNode* node) const {
+Ref<NSString> XQueryContextInternal::baseURIForNode(const NSXMLNode* node) {
   if (!node) return {};
-  Ref<NSString> own = XQueryNodeBaseURI(node);
+  Ref<NSString> own = _baseURIs.ofNode(node);
   if ((own && own->length() > 0) || _baseURINodeCount == 0) return own;
   return NSXMLTree::recordedBaseURI(node, _baseURIOwner);
 }

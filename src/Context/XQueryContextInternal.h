@@ -6,6 +6,7 @@
 #include "Context/XQueryFrame.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryNamespaceStack.h"
+#include "Types/XQueryBaseURIs.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
@@ -94,7 +95,7 @@ class XQueryContextInternal {
   // --- base URIs of constructed nodes ------------------------------------------------------------
   // Does nothing when either is null. The record is kept by the node's tree and dies with it.
   void setBaseURI(const Ref<NSString>& URI, const NSXMLNode* forNode);
-  Ref<NSString> baseURIForNode(const NSXMLNode* node) const;
+  Ref<NSString> baseURIForNode(const NSXMLNode* node);
   // How many nodes have ever been recorded, those that are gone included.
   size_t baseURINodeCount() const { return _baseURINodeCount; }
 
@@ -149,6 +150,11 @@ class XQueryContextInternal {
 
   // What expressions keep for their next evaluation within this one of the query.
   XQueryKeptValues& keptValues() { return _keptValues; }
+  // This and all else that is kept for the rest of an evaluation.
+  void clearKept() {
+    _keptValues.clear();
+    _baseURIs.clear();
+  }
   // The regular expressions compiled last; null until the first one.
   std::shared_ptr<XQueryRegExCache>& regExCache() { return _regExCache; }
 
@@ -175,6 +181,7 @@ class XQueryContextInternal {
   size_t _failureBytes = 0;          // of URLs that named no document
   NSURLTable<Ref<NSURLHandle>> _URLCache;
   XQueryKeptValues _keptValues;
+  XQueryBaseURIs _baseURIs;
   Ref<XQueryError> _error;
   Ref<XQueryDate> _currentDateTime;
   XQueryProlog* _prolog = nullptr;

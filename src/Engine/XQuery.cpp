@@ -178,7 +178,7 @@ namespace {
 
 // Marks the first result with the base URI that its construction recorded. What was there before
 // the evaluation stays as it is.
-void decorateWithBaseURI(const NSArray& items, const XQueryContextInternal& context) {
+void decorateWithBaseURI(const NSArray& items, XQueryContextInternal& context) {
   NSObject* first = items.objectAtIndex(0);
   if (const auto* document = dyn_cast<NSXMLDocument>(first)) first = document->rootElement();
   auto* element = dyn_cast<NSXMLElement>(first);
@@ -197,7 +197,7 @@ void decorateWithBaseURI(const NSArray& items, const XQueryContextInternal& cont
 void dropValues(XQueryContextInternal& context, const Value& formerContextItem,
                 int64_t formerPosition) {
   context._clearGlobals();
-  context.keptValues().clear();
+  context.clearKept();
   context._setInScopeVariables(nullptr);
   context.setContextItem(formerContextItem, formerPosition);
 }
@@ -213,7 +213,7 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
 
   const NSXMLEra era;
   context._clearGlobals();
-  context.keptValues().clear();
+  context.clearKept();
   context.forgetManyFailures();
   if (contextItem && !isNull(contextItem)) context.setContextItem(contextItem, 1);
   XQueryProlog& prolog = *compiled.prolog();
@@ -221,7 +221,7 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   context.setActiveProlog(&prolog);
   const Value result = evaluateModule(compiled, constants);
   context._clearGlobals();
-  context.keptValues().clear();
+  context.clearKept();
   context.forgetManyFailures();
   return shapedResult(result, error);
 }

@@ -1,0 +1,84 @@
+#include "Types/XQueryBaseURIs.h"
+
+#include "Platform/Base/WorkMeter.h"
+#include "Types/XQueryNodeFunctions.h"
+
+#include <algorithm>
+
+namespace xquery {
+
+namespace {
+
+const NSXMLNode* ownBase(const NSXMLElement* element) {
+  return element->attributeForName(NSStringView::ascii("xml:base"));
+}
+
+// Where the climb begins: for a document, and what stands directly in it, at its root element.
+const NSXMLElement* firstElement(const NSXMLNode* node) {
+  if (node && !isa<NSXMLElement>(node) && !isa<NSXMLDocument>(node)) node = node->parent();
+  const auto* document = dyn_cast<NSXMLDocument>(node);
+  return document ? document->rootElement() : dyn_cast<NSXMLElement>(node);
+}
+
+const NSXMLElement* elementAbove(const NSXMLElement* element) {
+  return dyn_cast<NSXMLElement>(element->parent());
+}
+
+Ref<NSString> textOf(const NSXMLNode* base) {
+  const Ref<NSString> text = base ? base->stringValue() : nullptr;
+  return text ? text : NSString::empty();
+}
+
+}  // namespace
+
+Ref<NSString> XQueryBaseURIs::ofNode(const NSXMLNode* node) {
+  constexpr int shortClimb = 32;
+  const NSXMLElement* element = firstElement(node);
+  for (int level = 0; element && level < shortClimb; ++level) {
+    if (const NSXMLNode* base = ownBase(element)) return textOf(base);
+    element = elementAbove(element);
+  }
+  return element ? ofDeepElement(element) : NSString::empty();
+}
+
+Ref<NSString> XQueryBaseURIs::ofDeepElement(const NSXMLElement* element) {
+  if (!_tree || !_tree->isOf(element)) {
+    clear();
+    _tree = NSXMLTreeIndexes::of(element);
+  }
+  if (!_tree) return XQueryNodeBaseURI(element);
+  NSXMLIndexList<const NSXMLElement*> climbed;
+  WorkPacer pacer;
+  size_t kept = 0;
+  while (element && (kept = levelsTo(element)) == 0) {
+    pacer.turn();
+    climbed.push_back(element);
+    element = elementAbove(element);
+  }
+  _way.resize(kept);
+  for (; !climbed.empty(); climbed.pop_back()) {
+    pacer.turn();
+    const NSXMLNode* base = ownBase(climbed.back());
+    if (!base && !_way.empty()) base = _way.back().base;
+    _way.push_back({climbed.back(), base});
+  }
+  return textOf(_way.back().base);
+}
+
+// The elements of a way are in document order.
+size_t XQueryBaseURIs::levelsTo(const NSXMLElement* element) const {
+  const auto isBefore = [](const Level& level, const NSXMLElement* other) {
+    return level.element->orderNumber() < other->orderNumber();
+  };
+  const auto found = std::lower_bound(_way.begin(), _way.end(), element, isBefore);
+  if (found == _way.end() || found->element != element) return 0;
+  return static_cast<size_t>(found - _way.begin()) + 1;
+}
+
+void XQueryBaseURIs::clear() {
+  _tree = NSXMLIndexesRef();
+  _way.clear();
+  _way.shrink_to_fit();
+}
+
+}  // namespace xquery
