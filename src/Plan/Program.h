@@ -19,6 +19,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -84,9 +85,9 @@ class XQueryProgram {
   XQueryPlaceID part(XQueryPlaceID whole, XQueryRole role) const;
 
   // Puts an expression in the place of another one. The list of places stays as it is: it tells of
-  // the expressions as they were written.
+  // the expressions as they were written, which live as long as it does.
   void replace(XQueryPlaceID place, Ref<XQueryExpr> expr) {
-    *_places[place].slot = std::move(expr);
+    _replaced.push_back(std::exchange(*_places[place].slot, std::move(expr)));
   }
   // Hands the bodies back to the declarations; the body of the query is the answer.
   Ref<XQueryExpr> install();
@@ -96,6 +97,7 @@ class XQueryProgram {
   void addModules(const XQueryProlog& main);
   friend class XQueryProgramReader;
 
+  std::vector<Ref<XQueryExpr>> _replaced;
   std::vector<XQueryProgramBody> _bodies;
   std::vector<XQueryPlace> _places;
   std::vector<XQueryPlaceID> _partsFirst;
