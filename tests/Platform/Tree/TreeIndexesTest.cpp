@@ -405,11 +405,11 @@ TEST(XMLTreeIndexes, NodesThatSomebodyHoldsStayWhatTheyWereAtAChange) {
 
 TEST(XMLTreeIndexes, OneThatIsEndedLeavesNothingBehind) {
   const auto document = parsed(Records(9).text(4000));
-  // The expanded names of the tree are made when first asked for, and stay.
-  static_cast<void>(NSXMLNameIndex::ofElements(document.get()));
-  static_cast<void>(NSXMLNameIndex::ofAttributes(document.get()));
   const NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(document.get());
   const NSXMLValueKey key{name("a"), {}, {}};
+  // What is made when a value is first asked for, and stays, is there then.
+  const auto elements = NSXMLNameIndex::ofElements(document.get());
+  static_cast<void>(NSXMLValueIndex::make(elements->nodes(key.element.get()), key));
   static_cast<void>(indexes->elements(wholeWalk));
   static_cast<void>(indexes->attributes(wholeWalk));
   static_cast<void>(indexes->values(key, wholeWalk));
