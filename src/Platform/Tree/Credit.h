@@ -89,6 +89,7 @@ class NSXMLCredit {
     std::array<std::array<Tree, 2>, 8> trees;
     std::array<std::array<Name, 2>, 16> names;
 
+    Credits() : trees(), names() {}  // clang must not look for one before the class ends
     std::array<Tree, 2>& placesOf(const NSXMLTree* tree) { return trees[hash(tree) % 8]; }
     std::array<Name, 2>& placesOf(const NSXMLName* name) { return names[hash(name) % 16]; }
 
