@@ -4,16 +4,14 @@
 // one may be one of several threads, each of which evaluates something of its own; what changes the
 // tree is alone with it.
 //
-//   when      An index costs about as much as the walk that it replaces. So work that an index
-//   would
-//             have saved is added up, and when it comes to half a walk through the tree, whoever
-//             asks next makes the index: a document that is asked once is walked once, and asking
-//             never costs much more than twice what it would with what comes later known.
+//   when      An index costs about as much as the walk that it replaces. So the work that an index
+//             would have saved is added up, and when it comes to half a walk through the tree,
+//             whoever asks next makes the index: a document that is asked once is walked once, and
+//             asking never costs much more than twice what it would with what comes later known.
 //   who       One thread makes it; others walk meanwhile, so that nobody waits. An index that is
 //             made is published by one pointer and never changes.
 //   limits    Making one looks at deadline and flag, and what it takes counts towards the ceiling
-//   of
-//             the evaluation that makes it. One that would take much of what is left below the
+//             of the evaluation that makes it. One that would take much of what is left below the
 //             ceiling is not made: the evaluation would have gone on without it.
 //   changes   The tree lets go of all of its indexes at any change of it. Who still has a reference
 //             to them sees the tree as it was, and asks `isOf` whether it still is.
