@@ -53,8 +53,16 @@ std::vector<Binding> splitBindings(const std::string& option, const std::vector<
   return bindings;
 }
 
+xquery::XQueryPlanFormat planFormat(const std::string& name) {
+  using xquery::XQueryPlanFormat;
+  if (name == "text") return XQueryPlanFormat::Text;
+  if (name == "json") return XQueryPlanFormat::JSON;
+  if (name == "dot") return XQueryPlanFormat::DOT;
+  throw CLI::ValidationError("--plan", "expected text, json or dot, not \"" + name + "\"");
+}
+
 struct RawOptions {
-  std::string query, first, second, output;
+  std::string query, first, second, output, plan;
   std::vector<std::string> variables, documents, namespaces;
 };
 
@@ -78,6 +86,9 @@ void declareOptions(CLI::App& app, RawOptions& raw, Options& options) {
   app.add_option("--repeat", options.repeat, "Evaluate N times, print the result once")
       ->type_name("N")
       ->check(CLI::Range(1U, 1000000000U));
+  app.add_flag("--plan{text}", raw.plan,
+               "Show how the query is evaluated instead of its result: --plan, --plan=json or "
+               "--plan=dot");
   app.add_option("first", raw.first)->group("");
   app.add_option("second", raw.second)->group("");
 }
@@ -95,6 +106,7 @@ void interpret(const CLI::App& app, const RawOptions& raw, Options& options) {
     if (hasSecond) options.input = raw.second;
   }
   if (app.count("-o") > 0) options.outputFile = raw.output;
+  if (app.count("--plan") > 0) options.plan = planFormat(raw.plan);
   options.variables = splitBindings("--var", raw.variables, Bound::Text);
   options.documents = splitBindings("--doc", raw.documents, Bound::File);
   for (Binding& binding : splitBindings("--namespace", raw.namespaces, Bound::Text)) {

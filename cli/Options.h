@@ -1,6 +1,8 @@
 // What the command line asks for.
 #pragma once
 
+#include "xquery/XQuery.h"
+
 #include <map>
 #include <optional>
 #include <string>
@@ -33,6 +35,7 @@ struct Options {
   bool html = false;
   bool stripSpace = false;
   bool time = false;
+  std::optional<xquery::XQueryPlanFormat> plan;  // to be shown instead of the result
   unsigned repeat = 1;
 };
 

@@ -89,7 +89,8 @@ Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
   XQueryLoading loading;
   const auto URL = NSURL::fileURLWithPath(options.queryText ? "./" : options.queryFile);
   if (URL) loading.moduleURL = URL->absoluteString()->utf8();
-  Ref<XQuery> query = XQuery::xqueryWithSource(source, loading);
+  const XQueryWay way = options.plan ? XQueryWay::Explained : XQueryWay::Planned;
+  Ref<XQuery> query = XQuery::xqueryWithSource(source, loading, XQueryLimits(), way);
   const Ref<NSArray> errors = query->parseErrors();
   if (!errors || errors->count() == 0) return query;
   stop(StatusQueryError, descriptions(*errors));
@@ -132,23 +133,41 @@ void printItem(const NSObject& item, bool types, Output& output) {
   output.append("\n");
 }
 
-bool print(const Options& options, const NSArray* items) {
+// Opens the output, has it written and closes it.
+template <class Write>
+bool print(const Options& options, Write write) {
   Output output;
   const std::string name = options.outputFile.value_or("standard output");
   if (output.open(options.outputFile)) {
+    write(output);
+    if (output.finish()) return true;
+  }
+  stop(StatusInput, "xquery: cannot write " + name + ": " + output.error());
+}
+
+bool printItems(const Options& options, const NSArray* items) {
+  return print(options, [&](Output& output) {
     const size_t count = items ? items->count() : 0;
     for (size_t i = 0; i < count && output.error().empty(); i++) {
       printItem(*items->objectAtIndex(i), options.types, output);
     }
-    if (output.finish()) return true;
-  }
-  stop(StatusInput, "xquery: cannot write " + name + ": " + output.error());
+  });
+}
+
+bool printPlan(const Options& options, const XQuery& query) {
+  return print(options, [&](Output& output) {
+    output.append(query.planDescription(*options.plan)->utf8());
+  });
 }
 
 void runPhases(const Options& options) {
   Phases phases;
   const Ref<NSString> source = queryText(options);
   const Ref<XQuery> query = phases.compile.measure([&] { return compile(options, source); });
+  if (options.plan) {
+    printPlan(options, *query);
+    return;
+  }
   Value contextItem;
   const XQueryConstants constants = phases.parse.measure([&] {
     if (options.input) {
@@ -164,7 +183,7 @@ void runPhases(const Options& options) {
     items =
         phases.evaluate.measure([&] { return evaluate(*context, *query, constants, contextItem); });
   }
-  phases.print.measure([&] { return print(options, items.get()); });
+  phases.print.measure([&] { return printItems(options, items.get()); });
   if (options.time) phases.report(options.repeat > 1);
 }
 

@@ -39,6 +39,14 @@ using XQueryConstants = std::map<std::string, Value>;
 enum class XQueryWay : uint8_t {
   Planned,  // unless the environment variable XQUERY_PLAN is "0" when the query is compiled
   Plain,
+  Explained,  // planned whatever the environment says, and the plan can be looked at
+};
+
+enum class XQueryPlanFormat : uint8_t {
+  Text,  // a line for each expression, those that it consists of indented below it
+  JSON,  // RFC 8259: an array of objects with "label", "line" (left out where there is none),
+         // "role" (left out where there is none), "items", "deeds", "notes" and "parts"
+  DOT,   // a graph, for the tools that draw such
 };
 
 // A compiled query. Errors found while compiling are kept in it.
@@ -75,11 +83,24 @@ class XQUERY_EXPORT XQuery : public NSCounted {
   [[nodiscard]] static Ref<XQuery> xqueryWithSource(std::string_view source,
                                                     const XQueryLoading& loading,
                                                     const XQueryLimits& limits, XQueryWay way);
+  [[nodiscard]] static Ref<XQuery> xqueryWithSource(const Ref<NSString>& source,
+                                                    const XQueryLoading& loading,
+                                                    const XQueryLimits& limits, XQueryWay way);
 
   // Null when the query compiled, else a new array of one XQueryError or more in the order found:
   // those of the parser, or, when it found none, those of the prolog and of names that do not
   // resolve. A module that was found but cannot be used has its own first error after the 47.
   Ref<NSArray> parseErrors() const;
+
+  // How the query is evaluated: its expressions as they were written, with what is known of their
+  // values, what each rule of the planner did with them, and where a rule saw its pattern and a
+  // fact was missing. The texts are for people and may change. Null for a query that was not
+  // compiled to be explained, and for one with errors.
+  //
+  //   auto query = XQuery::xqueryWithSource("count(//a[b = //c])", XQueryLoading(), XQueryLimits(),
+  //                                         XQueryWay::Explained);
+  //   if (auto plan = query->planDescription(XQueryPlanFormat::Text)) show(plan->utf8());
+  Ref<NSString> planDescription(XQueryPlanFormat format) const;
 
   // For the engine itself.
   XQueryInternal& _internal() const { return *_private; }

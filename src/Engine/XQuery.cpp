@@ -6,6 +6,7 @@
 #include "Context/XQueryGlobals.h"
 #include "Engine/XQueryInternal.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Report.h"
 #include "Platform/Base/HostFailure.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/NSLog.h"
@@ -83,9 +84,14 @@ Ref<XQuery> XQuery::xqueryWithSource(std::string_view source, const XQueryLoadin
 
 Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source, const XQueryLoading& loading,
                                      const XQueryLimits& limits) {
+  return xqueryWithSource(source, loading, limits, XQueryWay::Planned);
+}
+
+Ref<XQuery> XQuery::xqueryWithSource(const Ref<NSString>& source, const XQueryLoading& loading,
+                                     const XQueryLimits& limits, XQueryWay way) {
   return make<XQuery>(compiled(limits, [&] {
     if (!source) return failed(XQueryErrors::noSource.error());
-    return std::make_unique<XQueryInternal>(source, loading);
+    return std::make_unique<XQueryInternal>(source, loading, way);
   }));
 }
 
@@ -116,6 +122,20 @@ Ref<NSArray> XQuery::parseErrors() const {
   if (!_private->isError()) return {};
   const auto& errors = _private->errors();
   return NSArray::arrayWithObjects(std::vector<Value>(errors.begin(), errors.end()));
+}
+
+Ref<NSString> XQuery::planDescription(XQueryPlanFormat format) const {
+  const XQueryPlanReport* report = _private->planReport();
+  if (!report) return {};
+  switch (format) {
+    case XQueryPlanFormat::JSON:
+      return NSString::stringWithUTF8(report->JSON());
+    case XQueryPlanFormat::DOT:
+      return NSString::stringWithUTF8(report->DOT());
+    case XQueryPlanFormat::Text:
+      break;
+  }
+  return NSString::stringWithUTF8(report->text());
 }
 
 Ref<XQueryContext> XQueryContext::xqueryContext() {

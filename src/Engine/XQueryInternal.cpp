@@ -30,8 +30,17 @@ XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource, const XQuery
   _prolog->setNextLocalVariableID(1);
   if (_body) _body->bindInfoForProlog(*_prolog);
   _errors = _prolog->errors();
-  const bool isPlanned = way == XQueryWay::Planned && XQueryPlanIsEnabled();
-  if (_errors.empty() && isPlanned) _body = XQueryPlanned(*_prolog, _body);
+  if (_errors.empty()) plan(way);
+}
+
+void XQueryInternal::plan(XQueryWay way) {
+  if (way == XQueryWay::Explained) {
+    auto report = std::make_unique<XQueryPlanReport>();
+    _body = XQueryPlanned(*_prolog, _body, *report);
+    _planReport = std::move(report);
+  } else if (way == XQueryWay::Planned && XQueryPlanIsEnabled()) {
+    _body = XQueryPlanned(*_prolog, _body);
+  }
 }
 
 XQueryInternal::XQueryInternal(Ref<XQueryError> error) : _errors{std::move(error)} {}

@@ -7,10 +7,12 @@
 #include "xquery/String.h"
 #include "xquery/XQuery.h"
 
+#include <memory>
 #include <vector>
 
 namespace xquery {
 
+class XQueryPlanReport;
 class XQueryProlog;
 
 class XQueryInternal {
@@ -28,11 +30,16 @@ class XQueryInternal {
   XQueryExpr* body() const;
   const std::vector<Ref<XQueryError>>& errors() const { return _errors; }
   bool isError() const { return !_errors.empty(); }
+  // Of a query that was compiled to be explained, and without errors; else null.
+  const XQueryPlanReport* planReport() const { return _planReport.get(); }
 
  private:
+  void plan(XQueryWay way);
+
   Ref<XQueryProlog> _prolog;
   Ref<XQueryExpr> _body;
   std::vector<Ref<XQueryError>> _errors;
+  std::unique_ptr<const XQueryPlanReport> _planReport;
 };
 
 }  // namespace xquery

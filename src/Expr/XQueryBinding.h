@@ -28,6 +28,8 @@ class XQueryBindingExpr : public XQueryExpr {
            object.kind() == Kind::QuantifiedItem || object.kind() == Kind::CaseClause;
   }
 
+  // As written, without the dollar sign; null or empty for a case without a variable.
+  const Ref<NSString>& varName() const { return _varName; }
   // Null when the clause declares no type.
   XQueryTypeDeclaration* type() const { return _type.get(); }
   XQueryExpr* expr() const { return _expr.get(); }

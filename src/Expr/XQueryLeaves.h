@@ -44,6 +44,7 @@ class XQueryVariable : public XQueryExpr {
   // The name as written, prefix included, without the dollar sign.
   [[nodiscard]] static Ref<XQueryVariable> variableWithName(Ref<NSString> name);
 
+  const Ref<NSString>& name() const { return _name; }
   // 0 for a variable that is not local.
   int64_t varID() const { return _varID; }
   void bindInfoForProlog(XQueryProlog& prolog) override;

@@ -12,13 +12,35 @@ bool XQueryPlanIsEnabled() {
   return !value || std::string_view(value) != "0";
 }
 
+namespace {
+
+void applyRules(XQueryPlanning& planning, std::span<const XQueryRule> rules,
+                std::vector<XQueryPlanNote>* notes) {
+  for (const XQueryRule& rule : rules) {
+    planning.beginRule(rule, notes);
+    rule.apply(planning);
+  }
+}
+
+}  // namespace
+
 Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
                               std::span<const XQueryRule> rules) {
   XQueryProgram program(prolog, body);
   // Most queries of a line or two hold nothing that any rule could change.
   if (program.placeCount() < 2) return body;
   XQueryPlanning planning(program);
-  for (const XQueryRule& rule : rules) rule.apply(planning);
+  applyRules(planning, rules, nullptr);
+  return program.install();
+}
+
+Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
+                              XQueryPlanReport& report) {
+  XQueryProgram program(prolog, body);
+  XQueryPlanning planning(program);
+  std::vector<XQueryPlanNote> notes;
+  applyRules(planning, XQueryRules(), &notes);
+  report = XQueryPlanReport(planning, std::move(notes));
   return program.install();
 }
 

@@ -10,6 +10,7 @@
 #pragma once
 
 #include "Expr/XQueryExpr.h"
+#include "Plan/Report.h"
 #include "Plan/Rules.h"
 
 #include <span>
@@ -27,5 +28,8 @@ bool XQueryPlanIsEnabled();
 // planned body.
 Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
                               std::span<const XQueryRule> rules = XQueryRules());
+// The same, and what there is to say of it.
+Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
+                              XQueryPlanReport& report);
 
 }  // namespace xquery

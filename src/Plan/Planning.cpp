@@ -1,6 +1,7 @@
 #include "Plan/Planning.h"
 
 #include "Functions/XQueryFunctionCall.h"
+#include "Plan/Rules.h"
 
 #include <algorithm>
 
@@ -34,12 +35,18 @@ bool XQueryPlanning::showsIdentity(XQueryPlaceID place) const {
   return true;
 }
 
-void XQueryPlanning::wrap(XQueryPlaceID place, Ref<XQueryExpr> by) {
-  program.replace(place, std::move(by));
-  _states[place] = State::Wrapped;
+void XQueryPlanning::note(XQueryPlaceID place, bool isRefusal, std::string_view text) {
+  if (_notes) _notes->push_back({place, _rule, isRefusal, text.empty() ? _rule->summary : text});
 }
 
-void XQueryPlanning::replace(XQueryPlaceID place, Ref<XQueryExpr> by) {
+void XQueryPlanning::wrap(XQueryPlaceID place, Ref<XQueryExpr> by, std::string_view reason) {
+  program.replace(place, std::move(by));
+  _states[place] = State::Wrapped;
+  choose(place, reason);
+}
+
+void XQueryPlanning::replace(XQueryPlaceID place, Ref<XQueryExpr> by, std::string_view reason) {
+  choose(place, reason);
   program.replace(place, std::move(by));
   std::fill(_states.begin() + place, _states.begin() + program[place].end, State::Gone);
 }

@@ -4,11 +4,21 @@
 #include "Plan/FactsAnalysis.h"
 #include "Plan/Program.h"
 
+#include <string_view>
 #include <vector>
 
 namespace xquery {
 
 class XQueryPlannedExpr;
+struct XQueryRule;
+
+// What a rule did in a place, or why it did nothing there.
+struct XQueryPlanNote {
+  XQueryPlaceID place;
+  const XQueryRule* rule;
+  bool isRefusal;
+  std::string_view text;  // a literal
+};
 
 class XQueryPlanning {
  public:
@@ -31,9 +41,21 @@ class XQueryPlanning {
   bool showsIdentity(XQueryPlaceID place) const;
 
   // Puts an operator in the place, which evaluates what was written there or parts of it.
-  void wrap(XQueryPlaceID place, Ref<XQueryExpr> by);
+  void wrap(XQueryPlaceID place, Ref<XQueryExpr> by, std::string_view reason = {});
   // Puts an expression in the place; what was written there is evaluated no more.
-  void replace(XQueryPlaceID place, Ref<XQueryExpr> by);
+  void replace(XQueryPlaceID place, Ref<XQueryExpr> by, std::string_view reason = {});
+  // Notes, for those who ask to see the plan, that the rule saw its pattern in the place and left
+  // it as it was, and which fact was missing. Texts are literals.
+  void refuse(XQueryPlaceID place, std::string_view missing) { note(place, true, missing); }
+  // Notes something done in the place that puts no operator there. Without a text, as for the
+  // reasons above, it is the summary of the rule.
+  void choose(XQueryPlaceID place, std::string_view reason = {}) { note(place, false, reason); }
+
+  // The rule that is applied next; whose notes are kept where `notes` is not null.
+  void beginRule(const XQueryRule& rule, std::vector<XQueryPlanNote>* notes) {
+    _rule = &rule;
+    _notes = notes;
+  }
 
   XQueryProgram& program;
   const XQueryFactTable facts;
@@ -41,7 +63,11 @@ class XQueryPlanning {
  private:
   enum class State : uint8_t { AsWritten, Wrapped, Gone };
 
+  void note(XQueryPlaceID place, bool isRefusal, std::string_view text);
+
   std::vector<State> _states;
+  const XQueryRule* _rule = nullptr;
+  std::vector<XQueryPlanNote>* _notes = nullptr;
 };
 
 }  // namespace xquery

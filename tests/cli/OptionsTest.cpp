@@ -43,6 +43,33 @@ TEST(Options, EachItemIsOnALineOfItsOwn) {
             "1\ntwo\n3.5\nx=\"4\"\n<b/>\n");
 }
 
+TEST(Options, ThePlanIsShownInsteadOfTheResult) {
+  const Outcome outcome = xquery({"--plan", "-e", "//book[price > 2 * 5]", "no such file"});
+  EXPECT_EQ(outcome.status, 0);
+  EXPECT_EQ(outcome.err, "");
+  EXPECT_THAT(outcome.out, HasSubstr("query  any number of elements"));
+  EXPECT_THAT(outcome.out, HasSubstr("  //book[...]  (line 1)  any number of elements"));
+  EXPECT_THAT(outcome.out, HasSubstr("+ constants: "));
+  EXPECT_THAT(xquery({"--plan=json", "-e", "1"}).out, HasSubstr("[\n{\"label\":\"query\""));
+  EXPECT_THAT(xquery({"--plan=dot", "-e", "1"}).out, HasSubstr("digraph plan {"));
+}
+
+TEST(Options, ThePlanIsWrittenWhereTheResultWouldBe) {
+  const TemporaryDirectory directory;
+  const std::string file = directory.path("plan");
+  EXPECT_EQ(xquery({"--plan", "-o", file, "-e", "1"}).out, "");
+  EXPECT_THAT(readFile(file), HasSubstr("query  one integer"));
+}
+
+TEST(Options, ThePlanHasThreeFormatsAndNeedsAQueryWithoutErrors) {
+  const Outcome unknown = xquery({"--plan=xml", "-e", "1"});
+  EXPECT_EQ(unknown.status, 2);
+  EXPECT_THAT(unknown.err, HasSubstr("expected text, json or dot"));
+  const Outcome wrong = xquery({"--plan", "-e", "1 +"});
+  EXPECT_EQ(wrong.status, 1);
+  EXPECT_EQ(wrong.out, "");
+}
+
 TEST(Options, TypesPrecedeTheItemsWithATab) {
   const Outcome outcome =
       xquery({"--types", "-e",

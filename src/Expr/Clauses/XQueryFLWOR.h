@@ -25,6 +25,8 @@ class XQueryForExpr : public XQueryBindingExpr {
                                                        Ref<NSString> position,
                                                        Ref<XQueryExpr> expr);
 
+  // Null or empty without a positional variable.
+  const Ref<NSString>& posVarName() const { return _posVarName; }
   // 0 without a positional variable.
   int64_t posVarID() const { return _posVarID; }
   void bindInfoForProlog(XQueryProlog& prolog) override;

@@ -39,6 +39,8 @@ class XQueryQuantifiedExpr : public XQueryExpr {
   void visitParts(XQueryPartVisitor& visitor) override;
 
   const Items& items() const { return _items; }
+  // "every", not "some".
+  bool every() const { return _every; }
 
  protected:
   XQueryQuantifiedExpr(Items items, Ref<XQueryExpr> satisfies, bool every);

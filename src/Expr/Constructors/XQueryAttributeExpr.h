@@ -21,6 +21,7 @@ class XQueryAttributeExpr : public XQueryExpr {
   [[nodiscard]] static Ref<XQueryAttributeExpr> attributeExprWithName(
       const Ref<NSString>& name, std::vector<Ref<XQueryExpr>> forItems, char16_t enclosedWith);
 
+  const XQueryConstructorName& name() const { return _name; }
   char16_t quoteChar() const { return _quoteChar; }
   // Evaluates straight into an element that has no content yet. False for an error.
   bool addTo(XQueryElementContent& content, XQueryContext& context) const;

@@ -19,6 +19,8 @@ class XQueryConstructorName {
   // A string is a constant name, anything else an expression.
   explicit XQueryConstructorName(const Value& nameOrExpr);
 
+  // As written; null for an expression.
+  const Ref<NSString>& constantName() const { return _name; }
   // Resolves a constant name, or binds the expression. An element's name without a prefix takes the
   // nearest enclosing constructor's default namespace before the prolog's; an attribute's is in no
   // namespace. A name that does not resolve is an error in a library module and waits for the

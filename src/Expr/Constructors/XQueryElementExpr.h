@@ -22,6 +22,7 @@ class XQueryElementExpr : public XQueryExpr {
   [[nodiscard]] static Ref<XQueryElementExpr> elementExprWithNameExpr(const Value& nameExpr,
                                                                       Ref<XQueryExpr> value);
 
+  const XQueryConstructorName& name() const { return _name; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
   void visitParts(XQueryPartVisitor& visitor) override;

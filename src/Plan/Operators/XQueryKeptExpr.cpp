@@ -131,12 +131,20 @@ class XQueryKeptExpr::Outcome final : public XQueryKeptValue {
   int64_t _last = 0;
 };
 
-bool XQueryKeptExpr::canKeep(const XQueryFacts& facts) {
-  if (!facts.isRepeatable() || !facts.reads.isExact() || !facts.assigns.isExact()) return false;
-  if (facts.does(XQueryDeeds::ReadsPosition | XQueryDeeds::ReadsSize)) return false;
+std::string_view XQueryKeptExpr::obstacleTo(const XQueryFacts& facts) {
+  if (facts.does(XQueryDeeds::MakesNodes)) return "it makes nodes, new ones each time";
+  if (facts.does(XQueryDeeds::Traces)) return "it traces";
+  if (!facts.isRepeatable()) return "it may do something else when it is evaluated again";
+  if (facts.does(XQueryDeeds::ReadsPosition)) return "it reads the position";
+  if (facts.does(XQueryDeeds::ReadsSize)) return "it reads the size";
+  if (!facts.reads.isExact() || !facts.assigns.isExact()) {
+    return "it reads or sets too many variables to know them one by one";
+  }
   // What is around the nodes of a global variable is looked at by nobody.
-  if (facts.does(XQueryDeeds::ReadsOutside) && facts.does(XQueryDeeds::ReadsGlobals)) return false;
-  return facts.reads.count() <= mostVariables;
+  if (facts.does(XQueryDeeds::ReadsOutside) && facts.does(XQueryDeeds::ReadsGlobals)) {
+    return "it reads what is around nodes of a global variable, which may change";
+  }
+  return facts.reads.count() <= mostVariables ? "" : "it reads more variables than are compared";
 }
 
 Ref<XQueryKeptExpr> XQueryKeptExpr::exprWithPlain(Ref<XQueryExpr> plain, const XQueryFacts& facts) {

@@ -6,6 +6,7 @@
 #include "Plan/Operators/XQueryPlannedExpr.h"
 
 #include <cstddef>
+#include <string_view>
 
 namespace xquery {
 
@@ -13,9 +14,9 @@ class XQueryKeptExpr : public XQueryPlannedExpr {
  public:
   // An outcome that depends on more variables than this is not kept.
   static constexpr int mostVariables = 6;
-  // Whether all that the expression reads is known well enough to see when it changes, and
-  // evaluating it again is the same as not doing so.
-  static bool canKeep(const XQueryFacts& facts);
+  // Empty where all that the expression reads is known well enough to see when it changes, and
+  // evaluating it again is the same as not doing so; else what stands in the way.
+  static std::string_view obstacleTo(const XQueryFacts& facts);
 
   [[nodiscard]] static Ref<XQueryKeptExpr> exprWithPlain(Ref<XQueryExpr> plain,
                                                          const XQueryFacts& facts);

@@ -45,7 +45,12 @@ class Folding {
           kind == Kind::Args) {
         continue;
       }
-      if (_planning.isOpen(place) && !_planning.showsIdentity(place)) fold(place);
+      if (!_planning.isOpen(place)) continue;
+      if (_planning.showsIdentity(place)) {
+        _planning.refuse(place, "its value is handed on, and which object it is can be told");
+      } else {
+        fold(place);
+      }
     }
   }
 
@@ -104,6 +109,7 @@ class Folding {
     const Value value = normalised(at(place).expr->evaluateWithContext(*_context));
     if (XQueryHasFailed(value, *_context)) {
       // What ends the compilation ends it; anything else comes up when it is reached.
+      _planning.refuse(place, "it fails, which it may do only when it is reached");
       if (_context->_internal().isFailingForGood()) _context->_internal().throwFailure();
       _context->_internal().passOverFailure(nullptr);
       return;

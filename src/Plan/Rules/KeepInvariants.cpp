@@ -21,6 +21,8 @@
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 
+#include <string_view>
+
 namespace xquery {
 namespace {
 
@@ -64,9 +66,7 @@ class Search {
       if (whole != XQueryNoPlace && _isLaborious[place]) _isLaborious[whole] = true;
     }
     for (XQueryPlaceID place = 0; place < _program.placeCount(); ++place) {
-      if (_isLaborious[place] && canBeKept(place) && isInvariantSomewhere(place)) {
-        _planning.wrap(place, XQueryKeptExpr::exprWithPlain(*at(place).slot, facts(place)));
-      }
+      if (_isLaborious[place] && isOpen(place) && isInvariantSomewhere(place)) keep(place);
     }
   }
 
@@ -88,7 +88,7 @@ class Search {
     }
   }
 
-  bool canBeKept(XQueryPlaceID place) const {
+  bool isOpen(XQueryPlaceID place) const {
     const XQueryPlace& here = at(place);
     if (!_planning.isOpen(place) || XQueryTraitsOf(here.role).isNoValue) return false;
     if (here.expr->kind() == Kind::RootStepExpr || here.expr->kind() == Kind::Args) return false;
@@ -97,9 +97,19 @@ class Search {
     if (list && list->count() == 1) return false;
     // Loops walk ranges without making them.
     const auto* range = dyn_cast<XQueryOperatorExpr>(here.expr);
-    if (range && range->operatorType() == XQueryOperatorTo) return false;
-    if (!XQueryKeptExpr::canKeep(facts(place))) return false;
-    return facts(place).are(XQueryItems::Node) || !_planning.showsIdentity(place);
+    return !range || range->operatorType() != XQueryOperatorTo;
+  }
+
+  void keep(XQueryPlaceID place) {
+    const XQueryFacts& own = facts(place);
+    std::string_view obstacle = XQueryKeptExpr::obstacleTo(own);
+    if (obstacle.empty() && !own.are(XQueryItems::Node) && _planning.showsIdentity(place)) {
+      obstacle = "it may answer values that are no nodes, and which objects they are can be told";
+    }
+    if (!obstacle.empty()) return _planning.refuse(place, obstacle);
+    _planning.wrap(place, XQueryKeptExpr::exprWithPlain(*at(place).slot, own),
+                   "evaluated when it is first needed, and kept as long as nothing that it reads "
+                   "has changed");
   }
 
   // Whether some loop around it leaves all that it reads as it is.
