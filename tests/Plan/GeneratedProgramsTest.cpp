@@ -1,7 +1,7 @@
 // Generated programs: no value contradicts a fact, and the plan changes nothing that can be told.
 //
-// The environment variable XQUERY_PLAN_PROGRAMS says how many programs there are; XQUERY_PLAN_SEED
-// with which one to begin.
+// The environment variable XQUERY_PLAN_PROGRAMS says how many programs there are for each test, or
+// XQUERY_PLAN_SECONDS for how long there are more; XQUERY_PLAN_SEED with which one to begin.
 #include "Expr/Paths/NodeOrder.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Plan.h"
@@ -10,6 +10,7 @@
 #include "Plan/ProgramGenerator.h"
 
 #include <algorithm>
+#include <chrono>
 #include <cstdlib>
 #include <functional>
 
@@ -28,21 +29,25 @@ unsigned programCount() {
 }
 
 // Programs of which fewer come to a value, or are planned, show nothing.
-unsigned fewest() {
-  return programCount() / 5;
-}
+constexpr unsigned fewestPart = 5;
 
-void forEachProgram(const std::function<void(const std::string&, const Value&)>& visit) {
+// How many programs there were.
+unsigned forEachProgram(const std::function<void(const std::string&, const Value&)>& visit) {
+  using Clock = std::chrono::steady_clock;
   const unsigned first = numberFrom("XQUERY_PLAN_SEED", 1);
-  const unsigned count = programCount();
-  for (unsigned seed = first; seed < first + count; ++seed) {
+  const std::chrono::seconds time(numberFrom("XQUERY_PLAN_SECONDS", 0));
+  const auto end = Clock::now() + time;
+  unsigned seed = first;
+  for (; time.count() ? Clock::now() < end : seed < first + programCount(); ++seed) {
     ProgramGenerator generator(seed);
     const std::string xml = generator.document();
     const std::string program = generator.program();
     SCOPED_TRACE("XQUERY_PLAN_SEED=" + std::to_string(seed) + "\n" + xml + "\n" + program);
     visit(program, document(xml));
-    if (testing::Test::HasFailure()) return;
+    if (testing::Test::HasFailure()) break;
   }
+  testing::Test::RecordProperty("programs", static_cast<int>(seed - first));
+  return seed - first;
 }
 
 // --- facts ---------------------------------------------------------------------------------------
@@ -143,7 +148,7 @@ void checkEverything(XQueryPlanning& planning) {
 TEST(GeneratedPrograms, ContradictNoFact) {
   const XQueryRule rule = {"check", "", checkEverything};
   size_t values = 0;
-  forEachProgram([&](const std::string& text, const Value& contextItem) {
+  const unsigned programs = forEachProgram([&](const std::string& text, const Value& contextItem) {
     const auto query = compiled(text);
     auto& internal = query->_internal();
     const auto body =
@@ -155,7 +160,7 @@ TEST(GeneratedPrograms, ContradictNoFact) {
     const auto items = context->evaluateXQuery(*checked, {}, contextItem, &error);
     values += items ? 1 : 0;
   });
-  EXPECT_GT(values, fewest());
+  EXPECT_GT(values, programs / fewestPart);
 }
 
 // --- both ways -----------------------------------------------------------------------------------
@@ -163,15 +168,15 @@ TEST(GeneratedPrograms, ContradictNoFact) {
 TEST(GeneratedPrograms, AnswerTheSamePlannedAndPlain) {
   size_t operators = 0;
   size_t values = 0;
-  forEachProgram([&](const std::string& text, const Value& contextItem) {
+  const unsigned programs = forEachProgram([&](const std::string& text, const Value& contextItem) {
     const auto planned = compiled(text, XQueryWay::Planned);
     operators += OperatorList(*planned->_internal().body()).operators.size();
     const Outcome plain = outcomeOf(*compiled(text), contextItem);
     EXPECT_EQ(plain.lines, outcomeOf(*planned, contextItem).lines);
     values += plain.lines.empty() || plain.lines.front().starts_with("error") ? 0 : 1;
   });
-  EXPECT_GT(operators, fewest());
-  EXPECT_GT(values, fewest());
+  EXPECT_GT(operators, programs / fewestPart);
+  EXPECT_GT(values, programs / fewestPart);
 }
 
 }  // namespace
