@@ -89,6 +89,9 @@ class XQueryContextInternal {
   // The innermost constructor's declaration of the prefix; null when none declares it.
   const NSXMLNode* inScopeNamespaceForPrefix(NSStringView prefix) const;
   Ref<NSString> contextNamespaceForPrefix(NSStringView prefix) const;
+  bool hasDefaultNamespace() const {
+    return !_contextNamespaces.empty() && _contextNamespaces.contains(std::string());
+  }
   // A null URI removes the prefix.
   void addNamespace(const Ref<NSString>& URI, const Ref<NSString>& forPrefix);
 

@@ -12,6 +12,10 @@ constexpr std::array rules = {
                XQueryCompareNames},
     XQueryRule{"invariants", "what does not change in a loop is kept from one turn to the next",
                XQueryKeepInvariants},
+    XQueryRule{"texts", "comparing children and attributes with a constant makes no values",
+               XQueryCompareConstants},
+    XQueryRule{"short paths", "what a few steps find from one node is taken as it comes",
+               XQueryShortenPaths},
 };
 
 }  // namespace

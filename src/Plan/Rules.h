@@ -25,5 +25,7 @@ std::span<const XQueryRule> XQueryRules();
 void XQueryFoldConstants(XQueryPlanning& planning);
 void XQueryCompareNames(XQueryPlanning& planning);
 void XQueryKeepInvariants(XQueryPlanning& planning);
+void XQueryCompareConstants(XQueryPlanning& planning);
+void XQueryShortenPaths(XQueryPlanning& planning);
 
 }  // namespace xquery

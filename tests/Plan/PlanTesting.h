@@ -6,6 +6,7 @@
 #include "Plan/FactsAnalysis.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
 #include "Plan/Program.h"
+#include "Plan/Report.h"
 #include "Prolog/XQueryProlog.h"
 #include "xquery/xquery.h"
 
@@ -99,6 +100,20 @@ class OperatorList final : public XQueryPartVisitor {
     expr.visitParts(*this);
   }
 };
+
+// How often rules did something with a query, of those that `isCounted` names.
+template <class IsCounted>
+size_t choicesIn(std::string_view text, IsCounted isCounted) {
+  const auto query = compiled(text, XQueryWay::Explained);
+  size_t count = 0;
+  for (const auto& entry : query->_internal().planReport()->entries()) {
+    for (const auto& note : entry.notes) count += !note.isRefusal && isCounted(note.rule) ? 1 : 0;
+  }
+  return count;
+}
+inline size_t choicesOf(std::string_view rule, std::string_view text) {
+  return choicesIn(text, [rule](std::string_view each) { return each == rule; });
+}
 
 inline Value document(std::string_view xml) {
   NSXMLParseError failure;

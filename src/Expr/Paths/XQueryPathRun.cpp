@@ -18,9 +18,8 @@ constexpr uint32_t allKinds = namedKinds | XQueryKindBit(Kind::Document) |
 
 bool XQueryPathRun::contextHasDefaultNamespace() {
   if (_defaultNamespace == DefaultNamespace::Unknown) {
-    _defaultNamespace = context._internal().contextNamespaceForPrefix(NSStringView())
-                            ? DefaultNamespace::Present
-                            : DefaultNamespace::None;
+    _defaultNamespace = context._internal().hasDefaultNamespace() ? DefaultNamespace::Present
+                                                                  : DefaultNamespace::None;
   }
   return _defaultNamespace == DefaultNamespace::Present;
 }

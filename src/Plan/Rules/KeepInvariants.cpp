@@ -33,6 +33,10 @@ XQueryVariableSet variablesOf(const XQueryBindingExpr& clause) {
   return variables;
 }
 
+bool isAtHand(const XQueryExpr* expr) {
+  return expr && (expr->kind() == Kind::Variable || expr->kind() == Kind::ContextItemExpr);
+}
+
 // A path from a variable or the context item over a few children or attributes is done as quickly
 // as looked up.
 bool isShort(const XQueryPathExpr& path) {
@@ -41,8 +45,10 @@ bool isShort(const XQueryPathExpr& path) {
   for (const XQueryStep* step = path.step(); step; step = step->next()) {
     if (!step->predicates().empty() || ++steps > fewSteps) return false;
     const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
-    if (!axisStep && (step != path.step() || !dyn_cast<XQueryVariable>(step->expr()))) return false;
-    if (!axisStep) continue;
+    if (!axisStep) {
+      if (step != path.step() || !isAtHand(step->expr())) return false;
+      continue;
+    }
     const int axis = axisStep->axis();
     if (axis != XQueryAxisChild && axis != XQueryAxisAttribute && axis != XQueryAxisSelf &&
         axis != XQueryAxisParent) {

@@ -1,0 +1,43 @@
+#include "Plan/Operators/XQueryConstantComparison.h"
+
+#include "Expr/Operators/XQueryUntypedText.h"
+#include "xquery/Number.h"
+
+#include <cmath>
+
+namespace xquery {
+
+// No answer where the text of the node is no number and has to be one, which is an error.
+std::optional<bool> XQueryConstantComparison::holdsFor(const NSXMLNode& node) const {
+  const XQueryUntypedText text(node);
+  if (_constant.text) {
+    if (_relation.test == XQueryRelation::Equal) {
+      return text.view().equals(_constant.text->view()) != _relation.negated;
+    }
+    return _relation.holds(text.view().compare(_constant.text->view()));
+  }
+  double number = 0;
+  if (!scanDouble(text.view(), number)) return std::nullopt;
+  if (std::isnan(number)) return false;
+  return _relation.holds(number < _constant.number ? -1 : number > _constant.number ? 1 : 0);
+}
+
+Value XQueryConstantComparison::computeValue(XQueryContext& context) const {
+  NSXMLNode* start = _walk.start(context);
+  if (!start) return plain().evaluateWithContext(context);
+  size_t count = 0;
+  std::optional<bool> answer;
+  _walk.visit(start, [&](const NSXMLNode* found) {
+    ++count;
+    answer = holdsFor(*found);
+    // The first pair that holds decides, and so does the first one that cannot be compared. A
+    // value comparison wants to know that there is no second node.
+    return _isValueComparison ? count == 1 : answer == false;
+  });
+  const bool isOpen =
+      count == 0 ? !_isValueComparison : answer.has_value() && (!_isValueComparison || count == 1);
+  if (!isOpen) return plain().evaluateWithContext(context);
+  return count ? Value(NSNumber::numberWithBool(*answer)) : Value(NSNull::null());
+}
+
+}  // namespace xquery

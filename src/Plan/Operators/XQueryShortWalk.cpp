@@ -1,0 +1,65 @@
+#include "Plan/Operators/XQueryShortWalk.h"
+
+#include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
+#include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryLists.h"
+
+namespace xquery {
+
+bool XQueryShortWalk::readFrom(const XQueryExpr& expr) {
+  const XQueryExpr* origin = XQueryWithoutParentheses(&expr);
+  if (const auto* path = dyn_cast<XQueryPathExpr>(origin)) {
+    const XQueryStep* step = path->step();
+    origin = nullptr;
+    if (step && step->kind() == Kind::FilterStep && step->predicates().empty()) {
+      origin = XQueryWithoutParentheses(step->expr());
+      step = step->next();
+      if (!origin) return false;
+    }
+    for (; step; step = step->next()) {
+      const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
+      if (!axisStep || !readStep(*axisStep)) return false;
+    }
+    if (_count == 0) return false;
+  }
+  if (!origin || isa<XQueryContextItem>(origin)) return true;
+  const auto* variable = dyn_cast<XQueryVariable>(origin);
+  _varID = variable ? variable->varID() : 0;
+  return _varID != 0;
+}
+
+bool XQueryShortWalk::readStep(const XQueryAxisStep& step) {
+  if (_count == mostSteps || !step.predicates().empty()) return false;
+  // A parent comes first, so that there is one of them.
+  const bool isLeading = _count == 0 || _steps[_count - 1].axis == XQueryAxisParent;
+  const bool isOpen = step.axis() == XQueryAxisChild || step.axis() == XQueryAxisAttribute ||
+                      (step.axis() == XQueryAxisParent && isLeading);
+  if (!isOpen) return false;
+  const NSXMLExpandedName* name = nullptr;
+  uint32_t kinds = 0;
+  if (const auto* nameTest = dyn_cast<XQueryNameTest>(step.expr())) {
+    name = nameTest->boundName();
+    if (!name) {
+      name = nameTest->nameWithoutNamespace();
+      _needsNoDefaultNamespace = true;
+    }
+    if (!name) return false;
+    kinds = XQueryKindBit(Kind::Element) | XQueryKindBit(Kind::Attribute);
+  } else if (const auto* type = dyn_cast<XQueryTypeDeclaration>(step.expr())) {
+    if (type->data() || !type->acceptsCount(1)) return false;
+    if (type->type() == XQueryTypeDeclaration::TextTest) {
+      kinds = XQueryKindBit(Kind::Text);
+    } else if (type->type() == XQueryTypeDeclaration::AnyKindTest) {
+      kinds = UINT32_MAX;
+    } else {
+      return false;
+    }
+  } else {
+    return false;
+  }
+  _steps[_count++] = {step.axis(), kinds, name};
+  return true;
+}
+
+}  // namespace xquery

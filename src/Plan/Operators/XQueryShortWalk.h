@@ -1,0 +1,83 @@
+// The walk of a short path: from one node over children and attributes of given names, and of these
+// all there are.
+//
+// What such a path finds from one node comes in document order, each node once: the children of a
+// node stand in their order, the subtrees of two children do not meet, and attributes have no
+// children. So there is nothing to sort and nothing to look for twice.
+#pragma once
+
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Paths/XQueryAxisWalk.h"
+#include "Expr/Paths/XQueryPathRun.h"
+#include "xquery/XMLNode.h"
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+
+namespace xquery {
+
+class XQueryExpr;
+
+class XQueryShortWalk {
+ public:
+  static constexpr size_t mostSteps = 4;
+
+  // Of a path, or of "." and a local variable alone, in parentheses or not; false for any other
+  // expression. Lives no longer than that expression.
+  [[nodiscard]] bool readFrom(const XQueryExpr& expr);
+
+  // The node to start from; null where the walk is not open: there is none or there are several, or
+  // names have to be resolved in the namespaces of the context.
+  NSXMLNode* start(const XQueryContext& context) const {
+    const auto& dynamic = context._internal();
+    if (_needsNoDefaultNamespace && dynamic.hasDefaultNamespace()) return nullptr;
+    return dyn_cast<NSXMLNode>(_varID ? dynamic.variableForID(_varID)
+                                      : dynamic.contextItem().get());
+  }
+  // Visits what there is below the start, until the visitor answers false.
+  template <class Visit>
+  void visit(NSXMLNode* start, Visit visit) const {
+    visitFrom(0, start, visit);
+  }
+
+ private:
+  struct Step {
+    int axis;
+    uint32_t kinds;                 // as bits
+    const NSXMLExpandedName* name;  // null for any
+    bool takes(const NSXMLNode* node) const {
+      if ((kinds & XQueryKindBit(node->kind())) == 0) return false;
+      return !name || node->expandedName() == name;
+    }
+  };
+
+  bool readStep(const XQueryAxisStep& step);
+
+  // False to end the walk.
+  template <class Visit>
+  bool visitFrom(size_t index, NSXMLNode* node, Visit& visit) const {
+    if (index == _count) return visit(node);
+    const Step& step = _steps[index];
+    bool goesOn = true;
+    const auto take = [&](NSXMLNode* found) {
+      if (step.takes(found)) goesOn = visitFrom(index + 1, found, visit);
+      return goesOn;
+    };
+    if (step.axis == XQueryAxisChild) {
+      XQueryWalkSiblings(node->firstChild(), take);
+    } else if (step.axis == XQueryAxisAttribute) {
+      XQueryWalkAttributes(node, take);
+    } else if (node->parent()) {
+      take(node->parent());
+    }
+    return goesOn;
+  }
+
+  int64_t _varID = 0;  // 0 for the context item
+  bool _needsNoDefaultNamespace = false;
+  size_t _count = 0;
+  std::array<Step, mostSteps> _steps{};
+};
+
+}  // namespace xquery

@@ -1,0 +1,27 @@
+// A path over a few children and attributes.
+//
+// Pattern     "$p/name", "@id", "../price/text()": up to four steps to parents, which come first,
+//             to children and to attributes, by names or by text() and node(), without predicates,
+//             from the context item or a local variable
+// Facts       none are asked for: at each use it is asked whether there is one node to start from
+// Operator    XQueryShortPath: walks and takes what it finds as it comes
+// Why         what is found from one node comes in document order and each node once, as sorting
+//             would leave it; whatever else the path starts from is left to the path
+#include "Expr/Paths/XQueryPath.h"
+#include "Plan/Operators/XQueryShortPath.h"
+#include "Plan/Planning.h"
+#include "Plan/Rules.h"
+
+namespace xquery {
+
+void XQueryShortenPaths(XQueryPlanning& planning) {
+  for (XQueryPlaceID place = 0; place < planning.program.placeCount(); ++place) {
+    const XQueryPlace& at = planning.program[place];
+    if (!isa<XQueryPathExpr>(at.expr) || !planning.isOpen(place)) continue;
+    XQueryShortWalk walk;
+    if (!walk.readFrom(*at.expr)) continue;
+    planning.wrap(place, XQueryShortPath::exprWithPlain(*at.slot, walk));
+  }
+}
+
+}  // namespace xquery
