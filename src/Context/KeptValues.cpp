@@ -56,10 +56,10 @@ bool XQueryKeptValues::looksAway(const XQueryExpr& expr) {
   constexpr uint32_t period = 32;
   const auto found = _entries.find(&expr);
   if (found == _entries.end() || found->second.firsts < patience) return false;
-  Entry& entry = found->second;
-  ++entry.firsts;
-  if (entry.firsts < patience + period) return true;
-  entry.firsts = patience - 2;
+  uint32_t& firsts = found->second.firsts;
+  ++firsts;
+  if (firsts < patience + period) return true;
+  firsts = patience - 2;
   return false;
 }
 
@@ -71,22 +71,38 @@ uint64_t XQueryKeptValues::stamp() const {
   return _globalChanges + NSXMLTree::finishedChangeCount();
 }
 
+XQueryKeptValues::Entry* XQueryKeptValues::find(Entries& entries,
+                                                std::span<const Value> dependencies) {
+  std::vector<Entry>& all = entries.entries;
+  const auto isFor = [dependencies](const Entry& entry) { return entry.isFor(dependencies); };
+  const auto found = std::find_if(all.begin(), all.end(), isFor);
+  if (found == all.end()) return nullptr;
+  std::rotate(all.begin(), found, found + 1);
+  return &all.front();
+}
+
 XQueryKeptValues::Use XQueryKeptValues::use(const XQueryExpr& expr,
                                             std::span<const Value> dependencies, bool looksAround,
                                             std::shared_ptr<XQueryKeptValue>& kept) {
-  Entry& entry = _entries[&expr];
-  if (entry.stamp != stamp() || !entry.isFor(dependencies)) {
-    entry.dependencies.assign(dependencies.begin(), dependencies.end());
-    entry.stamp = stamp();
-    entry.isDecided = false;
-    entry.value = nullptr;
-    ++entry.firsts;
+  Entries& entries = _entries[&expr];
+  Entry* entry = find(entries, dependencies);
+  if (!entry || entry->stamp != stamp()) {
+    if (!entry) {
+      std::vector<Entry>& all = entries.entries;
+      if (all.size() == mostEntries) all.pop_back();
+      entry = &*all.insert(all.begin(), Entry());
+      entry->dependencies.assign(dependencies.begin(), dependencies.end());
+    }
+    entry->stamp = stamp();
+    entry->isDecided = false;
+    entry->value = nullptr;
+    ++entries.firsts;
     return Use::First;
   }
-  entry.firsts = 0;
-  if (!entry.isDecided && !XQueryAreSettled(dependencies, looksAround)) entry.isDecided = true;
-  kept = entry.value;
-  return entry.isDecided ? Use::Further : Use::Second;
+  entries.firsts = 0;
+  if (!entry->isDecided && !XQueryAreSettled(dependencies, looksAround)) entry->isDecided = true;
+  kept = entry->value;
+  return entry->isDecided ? Use::Further : Use::Second;
 }
 
 XQueryKeptValues::Use XQueryKeptValues::useAtOnce(const XQueryExpr& expr,
@@ -95,21 +111,18 @@ XQueryKeptValues::Use XQueryKeptValues::useAtOnce(const XQueryExpr& expr,
                                                   std::shared_ptr<XQueryKeptValue>& kept) {
   const Use found = use(expr, dependencies, looksAround, kept);
   if (found != Use::First) return found;
-  Entry& entry = _entries[&expr];
+  Entry& entry = _entries[&expr].entries.front();
   entry.isDecided = !XQueryAreSettled(dependencies, looksAround);
   kept = nullptr;
   return entry.isDecided ? Use::Further : Use::Second;
 }
 
-void XQueryKeptValues::keep(const XQueryExpr& expr, std::shared_ptr<XQueryKeptValue> value) {
-  Entry& entry = _entries[&expr];
-  entry.isDecided = true;
-  entry.value = std::move(value);
-}
-
 void XQueryKeptValues::keep(const XQueryExpr& expr, std::span<const Value> dependencies,
                             std::shared_ptr<XQueryKeptValue> value) {
-  if (_entries[&expr].isFor(dependencies)) keep(expr, std::move(value));
+  Entry* entry = find(_entries[&expr], dependencies);
+  if (!entry) return;
+  entry->isDecided = true;
+  entry->value = std::move(value);
 }
 
 }  // namespace xquery

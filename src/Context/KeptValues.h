@@ -15,12 +15,13 @@
 // So a use compares a few words, whatever the size of what was kept, and writes nothing that
 // another thread could look at.
 //
-// An expression has one kept value at most, for what it depended on when the value was made. What
-// is kept says itself what it is: a join keeps a table of keys. It is worth its making only when it
-// is used again, so it is made when the expression is evaluated the second time with the same
-// things to depend on. Most expressions never are (the path in "for $p in $people return
-// $p/profile[@income > 5000]"), and looking costs more than a short path, so after a few
-// disappointments in a row nobody looks but now and then.
+// An expression has a few kept values at most, for what it depended on when they were made: those
+// of the dependencies that were used last, so that a function may be called with one list and
+// another in turn. What is kept says itself what it is: a join keeps a table of keys. It is worth
+// its making only when it is used again, so it is made when the expression is evaluated the second
+// time with the same things to depend on. Most expressions never are (the path in "for $p in
+// $people return $p/profile[@income > 5000]"), and looking costs more than a short path, so after a
+// few disappointments in a row nobody looks but now and then.
 #pragma once
 
 #include "xquery/Object.h"
@@ -63,12 +64,11 @@ class XQueryKeptValues {
   // value is to be made at the first use (Second), and First is never answered.
   Use useAtOnce(const XQueryExpr& expr, std::span<const Value> dependencies, bool looksAround,
                 std::shared_ptr<XQueryKeptValue>& kept);
-  // Keeps what was made for these dependencies. Making it may have used the same expression for
-  // others, as a function does that calls itself: then nothing is kept.
+  // Keeps what was made for these dependencies. Making it may have used the same expression for so
+  // many others, as a function does that calls itself, that they are forgotten: then nothing is
+  // kept. A null value stands for: take the plain way as long as the dependencies are these.
   void keep(const XQueryExpr& expr, std::span<const Value> dependencies,
             std::shared_ptr<XQueryKeptValue> value);
-  // A null value stands for: take the plain way as long as the dependencies are these.
-  void keep(const XQueryExpr& expr, std::shared_ptr<XQueryKeptValue> value);
   void clear() { _entries.clear(); }
   // Before a global variable gets a value, or another one.
   void noteGlobalChange() { ++_globalChanges; }
@@ -84,12 +84,18 @@ class XQueryKeptValues {
     uint64_t stamp = UINT64_MAX;  // no stamp
     std::vector<Value> dependencies;
     bool isDecided = false;
-    uint32_t firsts = 0;  // in a row
     std::shared_ptr<XQueryKeptValue> value;
   };
+  static constexpr size_t mostEntries = 3;
+  struct Entries {
+    std::vector<Entry> entries;  // the one used last first
+    uint32_t firsts = 0;         // in a row
+  };
+  // The one for these dependencies, which is then the first; null when there is none.
+  static Entry* find(Entries& entries, std::span<const Value> dependencies);
 
   uint64_t _globalChanges = 0;
-  std::unordered_map<const XQueryExpr*, Entry> _entries;
+  std::unordered_map<const XQueryExpr*, Entries> _entries;
 };
 
 }  // namespace xquery

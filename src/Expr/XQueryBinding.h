@@ -4,9 +4,11 @@
 
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
+#include "Expr/XQueryPicker.h"
 #include "xquery/Collection.h"
 #include "xquery/String.h"
 
+#include <memory>
 #include <utility>
 
 namespace xquery {
@@ -36,6 +38,11 @@ class XQueryBindingExpr : public XQueryExpr {
   // The local variable that takes the value; 0 until bound, and when there is none.
   int64_t varID() const { return _varID; }
 
+  // Of a clause that walks items: who picks those that the condition behind it can hold for. Null
+  // where each is asked.
+  const XQueryPicker* picker() const { return _picker.get(); }
+  void setPicker(std::unique_ptr<const XQueryPicker> picker) { _picker = std::move(picker); }
+
   // The value that the variable takes, or what a case answers.
   Value computeValue(XQueryContext& context) const override;
   void visitParts(XQueryPartVisitor& visitor) override;
@@ -58,6 +65,9 @@ class XQueryBindingExpr : public XQueryExpr {
   Ref<XQueryTypeDeclaration> _type;
   Ref<XQueryExpr> _expr;
   int64_t _varID = 0;
+
+ private:
+  std::unique_ptr<const XQueryPicker> _picker;
 };
 
 }  // namespace xquery

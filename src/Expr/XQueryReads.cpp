@@ -22,11 +22,10 @@ class Reader {
   void add(const XQueryExpr* expr, bool hasOuterFocus) {
     if (expr) _waiting.push_back({expr, hasOuterFocus});
   }
-  // The steps up to `end`, of which only the test counts; to the last one when it is null.
-  void addSteps(const XQueryStep* first, const XQueryStep* end, bool hasOuterFocus) {
+  void addSteps(const XQueryStep* first, bool hasOuterFocus) {
     for (const XQueryStep* step = first; step; step = step->next()) {
-      addStep(*step, hasOuterFocus && step == first, step != end);
-      if (step == end || _waiting.size() > mostExpressions) return;
+      addStep(*step, hasOuterFocus && step == first);
+      if (_waiting.size() > mostExpressions) return;
     }
   }
 
@@ -45,13 +44,12 @@ class Reader {
     bool hasOuterFocus;
   };
 
-  void addStep(const XQueryStep& step, bool hasOuterFocus, bool withPredicates) {
+  void addStep(const XQueryStep& step, bool hasOuterFocus) {
     if (const auto* axisStep = dyn_cast<XQueryAxisStep>(&step)) {
       if (hasOuterFocus) _reads.focus = true;
       if (!staysInside(axisStep->axis())) _reads.outside = true;
     }
     add(step.expr(), hasOuterFocus);
-    if (!withPredicates) return;
     for (const auto& predicate : step.predicates()) add(predicate.get(), false);
   }
 
@@ -113,7 +111,7 @@ class Reader {
         _reads.loads = _reads.loads || cast<XQueryCallExpr>(part.expr)->loadsDocuments();
         return cast<XQueryCallExpr>(part.expr)->readsArgumentsOnly();
       case Kind::PathExpr:
-        addSteps(cast<XQueryPathExpr>(part.expr)->step(), nullptr, outer);
+        addSteps(cast<XQueryPathExpr>(part.expr)->step(), outer);
         return true;
       default:
         return false;
@@ -133,12 +131,6 @@ bool XQueryReads::readsVariable(int64_t varID) const {
 XQueryReads XQueryReadsOf(const XQueryExpr& expr) {
   Reader reader;
   reader.add(&expr, true);
-  return reader.run();
-}
-
-XQueryReads XQueryReadsOfSteps(const XQueryStep& first, const XQueryStep& end) {
-  Reader reader;
-  reader.addSteps(&first, &end, true);
   return reader.run();
 }
 

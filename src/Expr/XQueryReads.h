@@ -8,7 +8,6 @@
 namespace xquery {
 
 class XQueryExpr;
-class XQueryStep;
 
 struct XQueryReads {
   // Whether every evaluation with the same context item, position, size and variables gives an
@@ -34,9 +33,6 @@ struct XQueryReads {
 };
 
 XQueryReads XQueryReadsOf(const XQueryExpr& expr);
-// The same for the steps before `end` and the node test of `end` itself, in a path that begins with
-// `first`.
-XQueryReads XQueryReadsOfSteps(const XQueryStep& first, const XQueryStep& end);
 
 // Whether an expression may be evaluated any number of times for the same focus. Where something
 // may assign variables between two evaluations, an expression that reads one is not repeatable.

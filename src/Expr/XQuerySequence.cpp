@@ -108,4 +108,13 @@ XQueryItemList::XQueryItemList(const NSObject* value) {
   }
 }
 
+bool XQueryListItems(const XQueryItemList& list, std::vector<Value>& items) {
+  items.reserve(list.count());
+  for (size_t i = 0; i < list.count(); ++i) {
+    if (!list[i] || list[i]->kind() == Kind::Null || isa<NSArray>(list[i])) return false;
+    items.emplace_back(list[i]);
+  }
+  return true;
+}
+
 }  // namespace xquery

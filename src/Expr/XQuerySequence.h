@@ -4,6 +4,8 @@
 #include "xquery/Collection.h"
 #include "xquery/Object.h"
 
+#include <vector>
+
 namespace xquery {
 
 // A flat sequence: adding an array adds its items, adding the empty sequence adds nothing. So its
@@ -67,5 +69,8 @@ class XQueryItemList {
   NSObject* _single = nullptr;
   size_t _count = 0;
 };
+
+// Lists them; false when one is no item by itself: an array of a host within an array, or NSNull.
+bool XQueryListItems(const XQueryItemList& list, std::vector<Value>& items);
 
 }  // namespace xquery

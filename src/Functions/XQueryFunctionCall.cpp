@@ -120,6 +120,23 @@ Value XQueryFunctionCall::callDeclared(XQueryContext& context) const {
   return result;
 }
 
+Value XQueryFunctionCall::evaluatePartOfBody(const XQueryExpr& part,
+                                             std::span<const size_t> parameters,
+                                             XQueryContext& context) const {
+  XQueryCheckStack(context);
+  const auto& params = _functionDecl->params();
+  XQueryFrameRef frame = params.empty() ? XQueryFrameRef() : make<XQueryFrame>();
+  for (const size_t index : parameters) {
+    Value value = argument(index, context);
+    if (XQueryHasFailed(value, context)) return {};
+    if (const int64_t varID = params[index]->varID()) frame->setValue(std::move(value), varID);
+  }
+  auto& dynamic = context._internal();
+  const CalleeFrame calleeFrame(dynamic, std::move(frame));
+  const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
+  return part.evaluateWithContext(context);
+}
+
 Value XQueryFunctionCall::callBuiltIn(XQueryContext& context) const {
   const size_t count = argumentCount();
   if (count <= bufferSlots) {

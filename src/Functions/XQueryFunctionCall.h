@@ -4,6 +4,9 @@
 #include "Expr/XQueryCallExpr.h"
 #include "Functions/XQueryBuiltInFunction.h"
 
+#include <cstddef>
+#include <span>
+
 namespace xquery {
 
 class XQueryFunctionDecl;
@@ -35,6 +38,10 @@ class XQueryFunctionCall : public XQueryCallExpr {
   // An error that the function answers is one of the call.
   Value computeValue(XQueryContext& context) const override;
   void visitParts(XQueryPartVisitor& visitor) override;
+  // Of a declared function: what a part of its body comes to in this call, where it reads these
+  // parameters and no other local variable. The other arguments are not evaluated.
+  Value evaluatePartOfBody(const XQueryExpr& part, std::span<const size_t> parameters,
+                           XQueryContext& context) const;
 
  protected:
   XQueryFunctionCall(Ref<NSString> name, Ref<XQueryArgs> args)

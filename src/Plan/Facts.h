@@ -68,6 +68,10 @@ class XQueryVariableSet {
   bool meets(const XQueryVariableSet& others) const { return (_bits & others._bits) != 0; }
   // Whether all of them are known by their own.
   bool isExact() const { return (_bits & bitOf(most)) == 0; }
+  // Whether all of the others, known by their own, are among them.
+  bool holds(const XQueryVariableSet& others) const {
+    return others.isExact() && (others._bits & ~_bits) == 0;
+  }
   int count() const { return __builtin_popcountll(_bits); }
   template <class Visit>
   void forEach(Visit visit) const {

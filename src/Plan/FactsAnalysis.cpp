@@ -25,7 +25,7 @@ constexpr std::array rows = {
     Row{Kind::TypeDeclaration, XQueryFactsOfNoValue, false},
     Row{Kind::Args, XQueryFactsOfNoValue, false},
     Row{Kind::ExprList, XQueryFactsOfList, false},
-    Row{Kind::OperatorExpr, XQueryFactsOfOperator, true},
+    Row{Kind::OperatorExpr, XQueryFactsOfOperator, false},
     Row{Kind::InstanceOfExpr, XQueryFactsOfTruth, true},
     Row{Kind::CastableExpr, XQueryFactsOfTruth, true},
     Row{Kind::TreatExpr, XQueryFactsOfTreat, true},

@@ -1,6 +1,5 @@
 // Facts of literals, variables, "." and what stands in a query without being evaluated.
 #include "Expr/Clauses/XQueryFLWOR.h"
-#include "Expr/Clauses/XQueryQuantified.h"
 #include "Expr/Paths/XQueryPath.h"
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryLeaves.h"
@@ -25,14 +24,6 @@ XQueryFacts oneItemOf(const XQueryFacts& value) {
   XQueryFacts facts = XQueryFacts::one(value.kinds);
   if (facts.are(XQueryItems::Node)) facts.tree = value.tree;
   return facts;
-}
-
-// A variable of one clause of several may be read when that clause had no items, and nothing was
-// set.
-bool isSurelySet(const XQueryFactsAt& at, XQueryPlaceID clause) {
-  const XQueryPlace& binder = at.program[clause];
-  if (binder.expr->kind() != Kind::QuantifiedItem) return true;
-  return cast<XQueryQuantifiedExpr>(at.program[binder.parent].expr)->items().size() == 1;
 }
 
 XQueryFacts valueOfBinder(const XQueryFactsAt& at, XQueryPlaceID binder, int64_t varID) {
@@ -76,7 +67,7 @@ void XQueryFactsOfVariable(const XQueryFactsAt& at, XQueryFacts& facts) {
   }
   facts.reads.add(varID);
   const XQueryPlaceID binder = at.here().binder;
-  if (binder == XQueryNoPlace || !isSurelySet(at, binder)) {
+  if (!at.program.isSurelySet(at.place)) {
     facts.deeds |= XQueryDeeds::MayFail;
     return;
   }

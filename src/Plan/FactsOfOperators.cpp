@@ -51,12 +51,25 @@ void concludeSet(const Operands& operands, int type, XQueryFacts& facts) {
   facts.setItems(nodes);
 }
 
+// Nodes and untyped values are compared by their text, and any two numbers can be compared.
+bool canBeCompared(const Operands& operands) {
+  const auto are = [&](XQueryItemKinds kinds) {
+    return operands.left.are(kinds) && operands.right.are(kinds);
+  };
+  return are(Node | Untyped) || are(Numeric);
+}
+
 }  // namespace
 
 void XQueryFactsOfOperator(const XQueryFactsAt& at, XQueryFacts& facts) {
   const auto& expr = at.expr<XQueryOperatorExpr>();
   const Operands operands = operandsOf(at);
-  switch (XQueryOperatorExpr::operatorClassification(expr.operatorType())) {
+  const int operatorClass = XQueryOperatorExpr::operatorClassification(expr.operatorType());
+  constexpr int generalComparison = 6;
+  if (operatorClass != generalComparison || !canBeCompared(operands)) {
+    facts.deeds |= XQueryDeeds::MayFail;
+  }
+  switch (operatorClass) {
     case 1:  // logical: an error record on the right is handed on
       facts.setItems(Boolean | (operands.right.kinds & Other), 1, 1);
       break;

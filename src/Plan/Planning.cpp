@@ -1,7 +1,9 @@
 #include "Plan/Planning.h"
 
+#include "Expr/XQueryLeaves.h"
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Rules.h"
+#include "Prolog/XQueryDeclarations.h"
 
 #include <algorithm>
 
@@ -20,6 +22,32 @@ bool handsOnArguments(const XQueryFunctionCall& call) {
 }
 
 }  // namespace
+
+XQueryPlanning::XQueryPlanning(XQueryProgram& ofProgram)
+    : program(ofProgram), facts(ofProgram), _states(ofProgram.placeCount()) {
+  for (const XQueryProgramBody& body : program.bodies()) {
+    XQueryVariableSet parameters;
+    if (body.function) {
+      for (const auto& param : body.function->params()) parameters.add(param->varID());
+    }
+    XQueryVariableSet unset;
+    const XQueryPlaceID end = body.place < program.placeCount() ? program[body.place].end : 0;
+    for (XQueryPlaceID place = body.place; place < end; ++place) {
+      const auto* variable = dyn_cast<XQueryVariable>(program[place].expr);
+      if (!variable || program.isSurelySet(place)) continue;
+      XQueryVariableSet read;
+      read.add(variable->varID());
+      const bool isParameter = program[place].binder == XQueryNoPlace && parameters.holds(read);
+      if (!isParameter) unset.add(read);
+    }
+    _unset.push_back(unset);
+  }
+}
+
+bool XQueryPlanning::showsLeftovers(const XQueryVariableSet& variables, XQueryPlaceID place) const {
+  const auto body = static_cast<size_t>(&program.bodyOf(place) - program.bodies().data());
+  return _unset[body].meets(variables);
+}
 
 bool XQueryPlanning::showsIdentity(XQueryPlaceID place) const {
   for (int level = 0; place != XQueryNoPlace && level < mostLevels; ++level) {

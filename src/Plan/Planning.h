@@ -26,19 +26,27 @@ class XQueryPlanning {
   // length of a query, however deep that nests.
   static constexpr int mostLevels = 256;
 
-  explicit XQueryPlanning(XQueryProgram& ofProgram)
-      : program(ofProgram), facts(ofProgram), _states(ofProgram.placeCount()) {}
+  explicit XQueryPlanning(XQueryProgram& ofProgram);
 
   // Whether another expression may be put in this place. Not where one of an earlier rule stands,
   // nor inside of what an earlier rule has taken out of the program.
   bool isOpen(XQueryPlaceID place) const {
     return program[place].slot && _states[place] == State::AsWritten;
   }
+  // What is evaluated in the place.
+  Ref<XQueryExpr> exprAt(XQueryPlaceID place) const {
+    const XQueryPlace& at = program[place];
+    return at.slot ? *at.slot : Ref<XQueryExpr>(at.expr);
+  }
   // Whether an operator stands there that evaluates what was written.
   bool isWrapped(XQueryPlaceID place) const { return _states[place] == State::Wrapped; }
   // Whether it can be told which objects the items of the value are. Objects that are equal and not
   // the same are two items of a path's results, and two items of a host.
   bool showsIdentity(XQueryPlaceID place) const;
+
+  // Whether one of these variables may be read in the same body where nothing has set it, so that
+  // what was left in it can be told.
+  bool showsLeftovers(const XQueryVariableSet& variables, XQueryPlaceID place) const;
 
   // Puts an operator in the place, which evaluates what was written there or parts of it.
   void wrap(XQueryPlaceID place, Ref<XQueryExpr> by, std::string_view reason = {});
@@ -66,6 +74,7 @@ class XQueryPlanning {
   void note(XQueryPlaceID place, bool isRefusal, std::string_view text);
 
   std::vector<State> _states;
+  std::vector<XQueryVariableSet> _unset;  // for each body, those that may be read unset
   const XQueryRule* _rule = nullptr;
   std::vector<XQueryPlanNote>* _notes = nullptr;
 };

@@ -1,6 +1,7 @@
 #include "Plan/Program.h"
 
 #include "Expr/Clauses/XQueryFLWOR.h"
+#include "Expr/Clauses/XQueryQuantified.h"
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQueryLeaves.h"
 #include "Platform/Base/WorkMeter.h"
@@ -163,6 +164,13 @@ const XQueryProgramBody& XQueryProgram::bodyOf(XQueryPlaceID place) const {
   return *std::prev(std::upper_bound(_bodies.begin(), _bodies.end(), place, isBehind));
 }
 
+const XQueryProgramBody* XQueryProgram::bodyOfFunction(const XQueryFunctionDecl* function) const {
+  const auto found = std::find_if(_bodies.begin(), _bodies.end(), [&](const auto& body) {
+    return function && body.function == function;
+  });
+  return found == _bodies.end() ? nullptr : &*found;
+}
+
 XQueryPlaceID XQueryProgram::nextPart(XQueryPlaceID place) const {
   const XQueryPlaceID whole = _places[place].parent;
   const XQueryPlaceID next = _places[place].end;
@@ -173,6 +181,26 @@ XQueryPlaceID XQueryProgram::part(XQueryPlaceID whole, XQueryRole role) const {
   XQueryPlaceID found = firstPart(whole);
   while (found != XQueryNoPlace && _places[found].role != role) found = nextPart(found);
   return found;
+}
+
+XQueryPlaceID XQueryProgram::withoutParentheses(XQueryPlaceID place) const {
+  while (_places[place].expr->kind() == Kind::ExprList) {
+    const XQueryPlaceID first = firstPart(place);
+    if (first == XQueryNoPlace || nextPart(first) != XQueryNoPlace) break;
+    place = first;
+  }
+  return place;
+}
+
+// A quantifier's variable is not set when its clause had no items, but for the last one while the
+// condition is asked: that is asked for an item of the last clause only.
+bool XQueryProgram::isSurelySet(XQueryPlaceID variable) const {
+  const XQueryPlaceID binder = _places[variable].binder;
+  if (binder == XQueryNoPlace) return false;
+  if (_places[binder].expr->kind() != Kind::QuantifiedItem) return true;
+  const XQueryPlaceID whole = _places[binder].parent;
+  const auto& items = cast<XQueryQuantifiedExpr>(_places[whole].expr)->items();
+  return variable < _places[whole].end && _places[binder].expr == items.back().get();
 }
 
 Ref<XQueryExpr> XQueryProgram::install() {

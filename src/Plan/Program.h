@@ -76,6 +76,9 @@ class XQueryProgram {
   // The body that a place is in.
   const XQueryProgramBody& bodyOf(XQueryPlaceID place) const;
 
+  // The body of a declared function; null for one that is not of the program, as external ones.
+  const XQueryProgramBody* bodyOfFunction(const XQueryFunctionDecl* function) const;
+
   // The first part of a place, and the next part of the same whole; XQueryNoPlace for none.
   XQueryPlaceID firstPart(XQueryPlaceID place) const {
     return place + 1 < _places[place].end ? place + 1 : XQueryNoPlace;
@@ -83,6 +86,11 @@ class XQueryProgram {
   XQueryPlaceID nextPart(XQueryPlaceID place) const;
   // The first part in that role.
   XQueryPlaceID part(XQueryPlaceID whole, XQueryRole role) const;
+
+  // What stands there in parentheses, however many; the place itself for anything else.
+  XQueryPlaceID withoutParentheses(XQueryPlaceID place) const;
+  // Whether the local variable that is read there has been set, whatever happened before.
+  bool isSurelySet(XQueryPlaceID variable) const;
 
   // Puts an expression in the place of another one. The list of places stays as it is: it tells of
   // the expressions as they were written, which live as long as it does.

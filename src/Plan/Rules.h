@@ -25,6 +25,10 @@ std::span<const XQueryRule> XQueryRules();
 void XQueryFoldConstants(XQueryPlanning& planning);
 void XQueryCompareNames(XQueryPlanning& planning);
 void XQueryKeepInvariants(XQueryPlanning& planning);
+void XQueryCompareWithSets(XQueryPlanning& planning);
+void XQueryJoinForClauses(XQueryPlanning& planning);
+void XQueryJoinQuantifiers(XQueryPlanning& planning);
+void XQueryJoinSteps(XQueryPlanning& planning);
 void XQueryCompareConstants(XQueryPlanning& planning);
 void XQueryShortenPaths(XQueryPlanning& planning);
 

@@ -34,7 +34,7 @@ std::string uses(XQueryKeptValues& values, const std::vector<Value>& dependencie
         break;
       case XQueryKeptValues::Use::Second:
         text += "2";
-        values.keep(*owner, nullptr);
+        values.keep(*owner, {&dependency, 1}, nullptr);
         break;
       case XQueryKeptValues::Use::Further:
         text += "+";
@@ -48,7 +48,13 @@ TEST(KeptValues, KnowsTheUsesInARowWithTheSameDependencies) {
   XQueryKeptValues values;
   const Value a = string("a");
   const Value b = string("b");
-  EXPECT_EQ(uses(values, {a, a, a, a, b, b, b, a, b, b}), "12++12+112");
+  EXPECT_EQ(uses(values, {a, a, a, a, b, b, b, a, b, a}), "12++12++++");
+}
+
+TEST(KeptValues, RemembersTheDependenciesThatWereUsedLast) {
+  XQueryKeptValues values;
+  const Value a = string("a"), b = string("b"), c = string("c"), d = string("d");
+  EXPECT_EQ(uses(values, {a, b, a, b, a, c, a, d, a, b}), "1122+1+1+1");
 }
 
 TEST(KeptValues, LooksNowAndThenOnlyAfterManyFirstUses) {
@@ -77,7 +83,7 @@ TEST(KeptValues, AreMadeAtTheFirstUseWhereThatIsAskedFor) {
     text += use == XQueryKeptValues::Use::First ? "1" : kept ? "+" : "-";
     if (!kept) values.keep(*owner, {&dependency, 1}, std::make_shared<XQueryKeptValue>());
   }
-  EXPECT_EQ(text, "-+-++-");
+  EXPECT_EQ(text, "-+-+++");
 }
 
 TEST(KeptValues, AreNotKeptForOtherDependencies) {
@@ -87,8 +93,13 @@ TEST(KeptValues, AreNotKeptForOtherDependencies) {
   const Value b = string("b");
   std::shared_ptr<XQueryKeptValue> kept;
   values.useAtOnce(*owner, {&a, 1}, false, kept);
-  values.useAtOnce(*owner, {&b, 1}, false, kept);
+  for (const char* other : {"b", "c", "d"}) {
+    const Value dependency = string(other);
+    values.useAtOnce(*owner, {&dependency, 1}, false, kept);
+  }
   values.keep(*owner, {&a, 1}, std::make_shared<XQueryKeptValue>());
+  values.useAtOnce(*owner, {&a, 1}, false, kept);
+  EXPECT_FALSE(kept);
   values.useAtOnce(*owner, {&b, 1}, false, kept);
   EXPECT_FALSE(kept);
 }
@@ -105,7 +116,7 @@ char useOf(XQueryKeptValues& values, const Value& dependency) {
   std::shared_ptr<XQueryKeptValue> kept;
   const auto use = values.use(*anyExpression(), {&dependency, 1}, false, kept);
   if (use == XQueryKeptValues::Use::Second) {
-    values.keep(*anyExpression(), std::make_shared<XQueryKeptValue>());
+    values.keep(*anyExpression(), {&dependency, 1}, std::make_shared<XQueryKeptValue>());
   }
   return use == XQueryKeptValues::Use::First ? '1' : kept ? '+' : '2';
 }

@@ -242,9 +242,106 @@ class ProgramGenerator {
     }
   }
 
+  // --- joins ---
+
+  // Lists long enough for a table, mostly.
+  std::string many() {
+    const std::string list =
+        _random.oneOf({"//*", "//a", "//b", "//@x", "//*/@y", "data(//@*)", "//*/..", "//b/*",
+                       "(//*, <b x='1'/>)", "(//@x, 1, 'u', 2.5, 3e0)",
+                       "(//@x, xs:date('2004-10-29'))", variable()});
+    return _random.below(6)
+               ? "(" + list + ")[position() < " + _random.oneOf({"9", "10", "14"}) + "]"
+               : list;
+  }
+
+  std::string keyOf(const std::string& item) {
+    switch (_random.below(12)) {
+      case 0:
+        return item;
+      case 1:
+        return _random.oneOf({"string(", "number(", "data(", "name(", "exactly-one("}) + item + ")";
+      case 2:
+        return _random.oneOf({"number(", "exactly-one(", "xs:integer(", "zero-or-one("}) + item +
+               "/@x)";
+      case 3:
+        return item + _random.oneOf({"/..", "/*/@x", "//@y", "/ancestor::*/@x", "/text()"});
+      case 4:
+        return _functions.empty() ? item : _functions.front() + "(" + item + ")";
+      case 5:
+        return "(2 * " + item + "/@y)";
+      default:
+        return item + _random.oneOf({"/@x", "/@y", "/@*", "/*"});
+    }
+  }
+
+  std::string match(const std::string& item) {
+    static const std::vector<std::string> operators = {
+        " = ", " = ", " = ", " < ", " >= ", " != ", " eq ", " lt ", " is "};
+    const std::string other = _random.below(4) ? keyOf(variable()) : operand(1);
+    if (_random.below(6) == 0) {
+      return "(some $w in " + item + _random.oneOf({"/*", "/@*", "/.."}) + " satisfies " +
+             keyOf("$w") + _random.oneOf(operators) + other + ")";
+    }
+    return _random.below(2) ? keyOf(item) + _random.oneOf(operators) + other
+                            : other + _random.oneOf(operators) + keyOf(item);
+  }
+
+  std::string matches(const std::string& item) {
+    std::string text = match(item);
+    while (_random.below(3) == 0) {
+      text += " and " + (_random.below(3) ? match(item) : match(variable()));
+    }
+    return text;
+  }
+
+  std::string joined(int depth) {
+    if (_random.below(3) == 0) {
+      return many() + "[" + matches(".") + "]" + (_random.below(4) ? "" : "[" + match(".") + "]");
+    }
+    if (_random.below(2)) {
+      const std::string kind = _random.oneOf({"some", "some", "every"});
+      std::string text = kind + " $u in " + many();
+      return "(" + text +
+             within("$u",
+                    [&] {
+                      if (_random.below(2)) return " satisfies " + negatedFor(kind, matches("$u"));
+                      std::string rest = ", $v in " + (_random.below(2) ? many() : keyOf("$u"));
+                      return rest + within("$v", [&] {
+                               return " satisfies " +
+                                      negatedFor(kind, matches(_random.oneOf({"$u", "$v"})));
+                             });
+                    }) +
+             ")" + (_random.below(4) ? "" : ", " + std::string("$u"));
+    }
+    std::string text = "for $u in " + many() + " ";
+    return "(" + text +
+           within("$u",
+                  [&] {
+                    const std::string clause =
+                        _random.oneOf({"let $v := " + keyOf("$u"), "for $v in " + keyOf("$u"),
+                                       "for $v in " + many(), "for $v at $n in " + many()});
+                    return clause + within("$v", [&] {
+                             std::string rest = " where " + matches(_random.oneOf({"$u", "$v"}));
+                             return rest + " return " + (_random.below(2) ? "$v" : expr(depth - 1));
+                           });
+                  }) +
+           ")";
+  }
+
+  std::string negatedFor(const std::string& kind, const std::string& condition) {
+    return kind == "every" && _random.below(3) ? "not(" + condition + ")" : condition;
+  }
+
+  // The same condition for one item after another, so that a table is worth its making.
+  std::string join(int depth) {
+    std::string text = "for $o in (//a)[position() < 4] return (";
+    return "(" + text + within("$o", [&] { return joined(depth - 1); }) + "))";
+  }
+
   std::string expr(int depth) {
     if (depth <= 0) return _random.below(3) ? variable() : literal();
-    switch (_random.below(14)) {
+    switch (_random.below(17)) {
       case 0:
         return literal();
       case 1:
@@ -271,6 +368,9 @@ class ProgramGenerator {
       case 11:
         return "(" + comparison(depth - 1) + _random.oneOf({" and ", " or "}) +
                comparison(depth - 1) + ")";
+      case 12:
+      case 13:
+        return join(depth);
       default:
         return path(depth);
     }

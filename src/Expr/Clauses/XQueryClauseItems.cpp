@@ -8,7 +8,7 @@
 
 namespace xquery {
 
-XQueryClauseItems::XQueryClauseItems(const XQueryExpr* expr, bool flattens, XQueryContext& context)
+XQueryClauseItems::XQueryClauseItems(const XQueryExpr* expr, XQueryContext& context)
     : _list(nullptr) {
   if (const XQueryOperatorExpr* range = XQueryOperatorExpr::rangeIn(expr)) {
     const XQueryRangeBounds bounds = range->rangeBounds(context);
@@ -23,9 +23,24 @@ XQueryClauseItems::XQueryClauseItems(const XQueryExpr* expr, bool flattens, XQue
   }
   _value = XQueryEvaluateOrEmpty(expr, context);
   _haveFailed = XQueryHasFailed(_value, context);
-  if (flattens) _value = flattened(std::move(_value));
   _list = XQueryItemList(_value.get());
   _count = _list.count();
+}
+
+void XQueryClauseItems::flatten() {
+  if (_isRange) return;
+  _value = flattened(std::move(_value));
+  _list = XQueryItemList(_value.get());
+  _count = _list.count();
+}
+
+bool XQueryClauseItems::pick(const XQueryPicker* picker, XQueryContext& context,
+                             XQueryPicks& picks) const {
+  if (!picker || _isRange) return false;
+  const auto listItems = [this](std::vector<Value>& items) {
+    return XQueryListItems(_list, items);
+  };
+  return picker->pick(_value, listItems, context, picks);
 }
 
 Value XQueryClauseItems::operator[](size_t index) const {

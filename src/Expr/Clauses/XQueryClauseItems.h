@@ -5,6 +5,7 @@
 // integer has no effect and a range of too many items is refused beforehand all the same.
 #pragma once
 
+#include "Expr/XQueryPicker.h"
 #include "Expr/XQuerySequence.h"
 
 #include <cstddef>
@@ -17,13 +18,16 @@ class XQueryExpr;
 
 class XQueryClauseItems {
  public:
-  // Evaluates the expression, which may be null: no items. `flattens`: arrays inside an array are
-  // walked and NSNull in it is no item; otherwise the elements of an array are the items.
-  XQueryClauseItems(const XQueryExpr* expr, bool flattens, XQueryContext& context);
+  // Evaluates the expression, which may be null: no items. The elements of an array are the items.
+  XQueryClauseItems(const XQueryExpr* expr, XQueryContext& context);
+  // From now on arrays inside an array are walked, and NSNull in it is no item.
+  void flatten();
 
   // An error has come up instead of the items.
   bool haveFailed() const { return _haveFailed; }
   size_t count() const { return _count; }
+  // What the picker of the clause picks of them; false when each has to be asked.
+  bool pick(const XQueryPicker* picker, XQueryContext& context, XQueryPicks& picks) const;
   Value operator[](size_t index) const;
 
  private:

@@ -108,8 +108,6 @@ void XQueryFLWORExpr::bindInfoForProlog(XQueryProlog& prolog) {
   for (const auto& spec : _orderSpecs) spec->bindInfoForProlog(prolog);
   if (_returnExpr) _returnExpr->bindInfoForProlog(prolog);
   prolog.restoreLocalScope(scope);
-  const auto* last = _forLet.empty() ? nullptr : dyn_cast<XQueryForExpr>(_forLet.back().get());
-  _join = last ? XQueryForJoin::joinOf(*last, _whereExpr.get()) : nullptr;
 }
 
 void XQueryFLWORExpr::visitParts(XQueryPartVisitor& visitor) {
@@ -145,11 +143,13 @@ bool XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toRe
 bool XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
                                   XQueryFLWORResults& toResults, XQueryContext& withContext) const {
   const bool isLast = index + 1 == _forLet.size();
-  if (isLast && _join && evaluateJoin(clause, toResults, withContext)) {
-    return !withContext._internal().isFailing();
-  }
-  const XQueryClauseItems items(clause.expr(), true, withContext);
+  XQueryClauseItems items(clause.expr(), withContext);
   if (items.haveFailed()) return false;
+  XQueryPicks picks;
+  if (items.pick(clause.picker(), withContext, picks)) {
+    return evaluatePicks(clause, index, picks, toResults, withContext);
+  }
+  items.flatten();
   for (size_t k = 0; k < items.count(); ++k) {
     checkWork();
     Value item = items[k];
@@ -172,20 +172,18 @@ void XQueryFLWORExpr::setTuple(const XQueryForExpr& clause, Value item, size_t p
                       clause.posVarID());
 }
 
-// The tuples that the table of the join leaves over, up to an error; false when it has nothing to
-// say.
-bool XQueryFLWORExpr::evaluateJoin(const XQueryForExpr& clause, XQueryFLWORResults& toResults,
-                                   XQueryContext& withContext) const {
-  XQueryJoinTable::Selection selection;
-  const auto table = _join->select(*this, withContext, selection);
-  if (!table) return false;
-  const auto& items = table->items();
-  for (const auto& match : selection) {
+bool XQueryFLWORExpr::evaluatePicks(const XQueryForExpr& clause, size_t index,
+                                    const XQueryPicks& picks, XQueryFLWORResults& toResults,
+                                    XQueryContext& withContext) const {
+  const bool isLast = index + 1 == _forLet.size();
+  const auto& items = *picks.items;
+  for (const XQueryPick& pick : picks.chosen) {
     checkWork();
-    setTuple(clause, items[match.position], match.position, withContext);
-    const bool goesOn = _join->decides(match) ? addTuple(toResults, withContext)
-                                              : processItem(toResults, withContext);
-    if (!goesOn) return true;
+    setTuple(clause, items[pick.position], pick.position, withContext);
+    const bool goesOn = !isLast       ? evaluateStartingAt(index + 1, toResults, withContext)
+                        : pick.isSure ? addTuple(toResults, withContext)
+                                      : processItem(toResults, withContext);
+    if (!goesOn) return false;
   }
   // Where the ID is used again by a variable that is never set, the last item can be read.
   setTuple(clause, items.back(), items.size() - 1, withContext);

@@ -1,12 +1,10 @@
 // The FLWOR expression and the expressions that switch the ordering mode.
 #pragma once
 
-#include "Expr/Clauses/XQueryJoin.h"
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQueryExpr.h"
 #include "Expr/XQuerySequence.h"
 
-#include <memory>
 #include <utility>
 #include <vector>
 
@@ -133,8 +131,8 @@ class XQueryFLWORExpr : public XQueryExpr {
   bool isOfType(const XQueryBindingExpr& clause, const NSObject* value,
                 XQueryContext& context) const;
 
-  bool evaluateJoin(const XQueryForExpr& clause, XQueryFLWORResults& toResults,
-                    XQueryContext& withContext) const;
+  bool evaluatePicks(const XQueryForExpr& clause, size_t index, const XQueryPicks& picks,
+                     XQueryFLWORResults& toResults, XQueryContext& withContext) const;
   static void setTuple(const XQueryForExpr& clause, Value item, size_t position,
                        XQueryContext& context);
 
@@ -142,7 +140,6 @@ class XQueryFLWORExpr : public XQueryExpr {
   Ref<XQueryExpr> _whereExpr;
   OrderSpecs _orderSpecs;
   Ref<XQueryExpr> _returnExpr;
-  std::unique_ptr<const XQueryForJoin> _join;  // of the last clause; found by binding
 };
 
 // "ordered {...}" and "unordered {...}": the ordering mode for the extent of the operand.

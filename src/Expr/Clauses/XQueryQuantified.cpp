@@ -4,6 +4,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryClauseItems.h"
 #include "Expr/XQueryParts.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 
@@ -66,16 +67,22 @@ Value XQueryQuantifiedExpr::evaluatePostion(size_t index, XQueryContext& withCon
     Value answer = evaluateItems(clause, index, withContext);
     if (answer || withContext._internal().isFailing()) return answer;
   }
-  return NSNumber::numberWithBool(_every);
+  return undecided();
 }
 
 // The answer over the items of one clause; null when it has none.
 Value XQueryQuantifiedExpr::evaluateItems(size_t clause, size_t index,
                                           XQueryContext& context) const {
   const XQueryQuantifiedExprItem& binding = *_items[clause];
-  const XQueryClauseItems items(binding.expr(), false, context);
+  const XQueryClauseItems items(binding.expr(), context);
   if (items.haveFailed()) return {};
-  const NSNumber* undecided = _every ? NSNumber::trueValue() : NSNumber::falseValue();
+  XQueryPicks picks;
+  picks.wantsFirst = clause + 1 == _items.size();
+  // In the place of a clause without items it is only tried: the next one sets its variable again.
+  if (clause == index && items.pick(binding.picker(), context, picks)) {
+    return evaluatePicks(clause, picks, context);
+  }
+  const Value open = undecided();
   Value answer;
   for (size_t i = 0; i < items.count(); ++i) {
     Value item = items[i];
@@ -84,9 +91,26 @@ Value XQueryQuantifiedExpr::evaluateItems(size_t clause, size_t index,
     }
     context._internal().setVariable(std::move(item), binding.varID());
     answer = evaluatePostion(index + 1, context);
-    if (answer.get() != undecided) break;
+    if (answer != open) break;
   }
   return answer;
+}
+
+// The same of the items that may decide; there are others.
+Value XQueryQuantifiedExpr::evaluatePicks(size_t clause, const XQueryPicks& picks,
+                                          XQueryContext& context) const {
+  const int64_t varID = _items[clause]->varID();
+  const bool isLast = clause + 1 == _items.size();
+  const Value open = undecided();
+  for (const XQueryPick& pick : picks.chosen) {
+    checkWork();
+    context._internal().setVariable((*picks.items)[pick.position], varID);
+    if (pick.isSure && isLast) return NSNumber::numberWithBool(!_every);
+    Value answer = evaluatePostion(clause + 1, context);
+    if (answer != open) return answer;
+  }
+  context._internal().setVariable(picks.items->back(), varID);
+  return open;
 }
 
 }  // namespace xquery

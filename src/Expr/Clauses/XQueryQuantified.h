@@ -3,6 +3,8 @@
 
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQueryExpr.h"
+#include "Expr/XQueryPicker.h"
+#include "xquery/Number.h"
 
 #include <vector>
 
@@ -51,6 +53,9 @@ class XQueryQuantifiedExpr : public XQueryExpr {
   // The misspelling belongs to the name.
   Value evaluatePostion(size_t index, XQueryContext& withContext) const;
   Value evaluateItems(size_t clause, size_t index, XQueryContext& context) const;
+  Value evaluatePicks(size_t clause, const XQueryPicks& picks, XQueryContext& context) const;
+  // What an item answers that leaves the question open.
+  Value undecided() const { return NSNumber::numberWithBool(_every); }
 
   Items _items;
   Ref<XQueryExpr> _satisfies;

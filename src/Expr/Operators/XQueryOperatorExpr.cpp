@@ -207,7 +207,6 @@ Value XQueryOperatorExpr::evaluateWithLeftValue(const Value& left, XQueryContext
   return answerFor(left, *right, context);
 }
 
-// What cannot be answered is an error.
 Value XQueryOperatorExpr::answerFor(const Value& left, const Value& right,
                                     XQueryContext& context) const {
   Value answer = isSign() ? XQueryUnarySign(_type, right, context)

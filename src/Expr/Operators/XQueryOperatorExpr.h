@@ -68,6 +68,10 @@ class XQueryOperatorExpr : public XQueryExpr {
   // What the operands of a range operator come to; no answer for one that has failed or is invalid.
   XQueryRangeBounds rangeBounds(XQueryContext& context) const;
 
+  // What the operator answers for operands that have been evaluated; what cannot be answered is an
+  // error of the expression.
+  Value answerFor(const Value& left, const Value& right, XQueryContext& context) const;
+
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
   void visitParts(XQueryPartVisitor& visitor) override;
@@ -111,7 +115,6 @@ class XQueryOperatorExpr : public XQueryExpr {
   Value evaluateWithRange(const Value& left, const XQueryOperatorExpr& range,
                           XQueryContext& context) const;
   const XQueryOperatorExpr* rangeToCompareWith() const;
-  Value answerFor(const Value& left, const Value& right, XQueryContext& context) const;
   const Value& leftOrEmpty(const Value& left) const;
 
   int _type;

@@ -440,7 +440,6 @@ void XQueryPathExpr::bindInfoForProlog(XQueryProlog& prolog) {
   for (XQueryStep* step = _step.get(); step; step = step->next()) step->bindInfoForProlog(prolog);
   findShortcuts();
   findGatheringSteps();
-  _join = XQueryPathJoin::joinOf(_step.get());
 }
 
 void XQueryPathExpr::findShortcuts() {
@@ -516,7 +515,7 @@ Value XQueryPathExpr::evaluateSteps(XQueryContext& context) const {
   run.setsEveryFocus = !allAreNodes(items);
   run.orderIsFree = dynamic.ordered();
   run.trailCount = _trailCount;
-  if (!_join || !joinNodes(items, *step, run)) step->processValue(items, run, true);
+  if (!_picker || !pickNodes(items, *step, run)) step->processValue(items, run, true);
   if (run.hasFailed) return {};
   return results.value(dynamic.ordered());
 }
@@ -524,32 +523,24 @@ Value XQueryPathExpr::evaluateSteps(XQueryContext& context) const {
 Value XQueryPathExpr::evaluateFirstStep(const XQueryStep& step, XQueryContext& context) const {
   Value items = step.expr() ? step.expr()->evaluateWithContext(context) : Value(NSNull::null());
   if (XQueryHasFailed(items, context)) return {};
-  if (_join && _join->step() == &step && joinItems(items, context)) return items;
+  if (_picker && _pickedStep == &step && pickItems(items, context)) return items;
   return step.handlePreicatesFromIndex(0, std::move(items), context);
 }
 
-// --- joins ---------------------------------------------------------------------------------------
+// --- picking -------------------------------------------------------------------------------------
 
-// Filters the items of the first step by the table of the join; false when it has nothing to say.
-bool XQueryPathExpr::joinItems(Value& items, XQueryContext& context) const {
+// Filters the items of the first step, of which only some are asked; false when each has to be.
+bool XQueryPathExpr::pickItems(Value& items, XQueryContext& context) const {
   const auto listItems = [&items](std::vector<Value>& listed) {
-    const XQueryItemList list(items.get());
-    for (size_t i = 0; i < list.count(); ++i) {
-      if (!list[i] || list[i]->kind() == Kind::Null || isa<NSArray>(list[i])) return false;
-      listed.emplace_back(list[i]);
-    }
-    return true;
+    return XQueryListItems(XQueryItemList(items.get()), listed);
   };
-  XQueryJoinTable::Selection selection;
-  const auto table = _join->select(*this, items, listItems, context, selection);
-  if (!table) return false;
-  const XQueryExpr& predicate = *_join->step()->predicates().front();
-  context._internal().setLast(static_cast<int64_t>(table->items().size()));
+  XQueryPicks picks;
+  if (!_picker->pick(items, listItems, context, picks)) return false;
+  context._internal().setLast(static_cast<int64_t>(picks.items->size()));
   XQueryGatherer kept;
-  for (const auto& match : selection) {
-    const Value& item = table->items()[match.position];
-    const int64_t position = int64_t{match.position} + 1;
-    if (_join->decides(match) || XQueryStep::keeps(predicate, item.get(), position, context)) {
+  for (const XQueryPick& pick : picks.chosen) {
+    const Value& item = (*picks.items)[pick.position];
+    if (pick.isSure || _pickedStep->keepsByAll(item.get(), int64_t{pick.position} + 1, context)) {
       kept.add(item);
     } else if (context._internal().isFailing()) {
       items = Value();
@@ -560,39 +551,60 @@ bool XQueryPathExpr::joinItems(Value& items, XQueryContext& context) const {
   return true;
 }
 
-// The same for the nodes that reach the join's step from `firstStep`: hands on what is left.
-bool XQueryPathExpr::joinNodes(const Value& start, const XQueryStep& firstStep,
+// The nodes that reach the predicates of a step from `firstStep`.
+bool XQueryPathExpr::listNodes(const Value& start, const XQueryStep& firstStep,
+                               const XQueryStep& step, XQueryPathRun& run,
+                               std::vector<Value>& listed) const {
+  XQueryPathRun listing(run.results, run.context);
+  listing.setsEveryFocus = false;
+  listing.orderIsFree = run.orderIsFree;
+  listing.trailCount = _trailCount;
+  listing.listingStep = &step;
+  listing.listed = &listed;
+  firstStep.processValue(start, listing, true);
+  run.hasFailed = listing.hasFailed;
+  return !listing.hasFailed;
+}
+
+bool XQueryPathExpr::listNodesBefore(const XQueryStep& step, XQueryContext& context,
+                                     std::vector<Value>& nodes) const {
+  const XQueryStep* firstStep = _step.get();
+  Value start = context._internal().contextItem();
+  if (!isa<XQueryAxisStep>(firstStep)) {
+    start = evaluateFirstStep(*firstStep, context);
+    if (XQueryHasFailed(start, context)) return false;
+    firstStep = firstStep->next();
+  }
+  if (!start || !allAreNodes(start)) return false;
+  XQueryPathResults results;
+  XQueryPathRun run(results, context);
+  return isNull(start) || listNodes(start, *firstStep, step, run, nodes);
+}
+
+// The same for the nodes that reach the picked step from `firstStep`: hands on what is left.
+bool XQueryPathExpr::pickNodes(const Value& start, const XQueryStep& firstStep,
                                XQueryPathRun& run) const {
-  const XQueryStep* joinStep = _join->step();
-  if (!isa<XQueryAxisStep>(joinStep) || run.setsEveryFocus) return false;
-  const auto listNodes = [&](std::vector<Value>& listed) {
-    XQueryPathRun listing(run.results, run.context);
-    listing.setsEveryFocus = false;
-    listing.trailCount = _trailCount;
-    listing.listingStep = joinStep;
-    listing.listed = &listed;
-    firstStep.processValue(start, listing, true);
-    run.hasFailed = listing.hasFailed;
-    return !listing.hasFailed;
+  if (!isa<XQueryAxisStep>(_pickedStep) || run.setsEveryFocus) return false;
+  const auto list = [&](std::vector<Value>& listed) {
+    return listNodes(start, firstStep, *_pickedStep, run, listed);
   };
-  XQueryJoinTable::Selection selection;
-  const auto table = _join->select(*this, start, listNodes, run.context, selection);
+  XQueryPicks picks;
+  const bool hasPicked = _picker->pick(start, list, run.context, picks);
   if (run.hasFailed) return true;
-  if (!table) return false;
-  const XQueryExpr& predicate = *joinStep->predicates().front();
+  if (!hasPicked) return false;
   std::vector<NSXMLNode*>& nodes = run.openNodeList();
-  for (const auto& match : selection) {
-    auto* node = cast<NSXMLNode>(table->items()[match.position]);
-    // The predicate cannot tell at which position the node stands.
-    if (_join->decides(match) || XQueryStep::keeps(predicate, node, 1, run.context)) {
+  for (const XQueryPick& pick : picks.chosen) {
+    auto* node = cast<NSXMLNode>((*picks.items)[pick.position]);
+    // The predicates cannot tell at which position the node stands.
+    if (pick.isSure || _pickedStep->keepsByAll(node, 1, run.context)) {
       nodes.push_back(node);
     } else if (run.context._internal().isFailing()) {
       run.hasFailed = true;
       return true;
     }
   }
-  if (joinStep->next()) {
-    joinStep->next()->processNodes(nodes, run);
+  if (_pickedStep->next()) {
+    _pickedStep->next()->processNodes(nodes, run);
   } else {
     for (NSXMLNode* node : nodes) run.results.addNode(node, run.context);
   }

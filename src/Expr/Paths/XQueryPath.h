@@ -6,9 +6,9 @@
 // tree is kept alive by the item the path started from.
 #pragma once
 
-#include "Expr/Clauses/XQueryJoin.h"
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
+#include "Expr/XQueryPicker.h"
 #include "xquery/XMLNode.h"
 
 #include <memory>
@@ -62,6 +62,8 @@ class XQueryStep : public NSCounted {
   // then the context is failing.
   static bool keeps(const XQueryExpr& predicate, NSObject* item, int64_t position,
                     XQueryContext& context);
+  // Whether every predicate keeps it.
+  bool keepsByAll(NSObject* item, int64_t position, XQueryContext& context) const;
   // Does nothing here.
   virtual void processItems(const Value& items, XQueryPathResults& toResults,
                             XQueryContext& forContext, bool validate) const;
@@ -215,6 +217,18 @@ class XQueryPathExpr : public XQueryExpr {
   static bool classof(const NSObject& object) { return object.kind() == Kind::PathExpr; }
   [[nodiscard]] static Ref<XQueryPathExpr> pathExprWithStep(Ref<XQueryStep> step);
   XQueryStep* step() const { return _step.get(); }
+  // Who picks the items of one of the steps that its predicates may keep: items of the first step,
+  // or nodes of an axis step, before which there are but the first step and axis steps whose tests
+  // raise nothing. The predicates are repeatable, and cannot tell where an item stands.
+  const XQueryPicker* picker() const { return _picker.get(); }
+  void setPicker(std::unique_ptr<const XQueryPicker> picker, const XQueryStep* ofStep) {
+    _picker = std::move(picker);
+    _pickedStep = ofStep;
+  }
+  // Lists the nodes that the predicates of such an axis step are asked for; false when that fails,
+  // and for items that are no nodes.
+  bool listNodesBefore(const XQueryStep& step, XQueryContext& context,
+                       std::vector<Value>& nodes) const;
   // The chain of steps does not change afterwards.
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
@@ -229,14 +243,17 @@ class XQueryPathExpr : public XQueryExpr {
  private:
   Value evaluateSteps(XQueryContext& context) const;
   Value evaluateFirstStep(const XQueryStep& step, XQueryContext& context) const;
-  bool joinItems(Value& items, XQueryContext& context) const;
-  bool joinNodes(const Value& start, const XQueryStep& firstStep, XQueryPathRun& run) const;
+  bool listNodes(const Value& start, const XQueryStep& firstStep, const XQueryStep& step,
+                 XQueryPathRun& run, std::vector<Value>& listed) const;
+  bool pickItems(Value& items, XQueryContext& context) const;
+  bool pickNodes(const Value& start, const XQueryStep& firstStep, XQueryPathRun& run) const;
   void findShortcuts();
   void findGatheringSteps();
 
   Ref<XQueryStep> _step;
   size_t _trailCount = 0;
-  std::unique_ptr<const XQueryPathJoin> _join;  // found by binding
+  std::unique_ptr<const XQueryPicker> _picker;
+  const XQueryStep* _pickedStep = nullptr;
 };
 
 }  // namespace xquery

@@ -123,6 +123,12 @@ bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t posi
   return false;
 }
 
+bool XQueryStep::keepsByAll(NSObject* item, int64_t position, XQueryContext& context) const {
+  return std::all_of(_predicates.begin(), _predicates.end(), [&](const auto& predicate) {
+    return keeps(*predicate, item, position, context);
+  });
+}
+
 std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicate) {
   const XQueryLiteral* literal = literalIn(predicate);
   if (!literal || !XQueryIsNumericType(literal->literalValue().get())) return std::nullopt;

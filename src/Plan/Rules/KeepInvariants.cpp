@@ -67,7 +67,7 @@ class Search {
 
   void run() {
     for (const XQueryPlaceID place : _program.partsFirst()) {
-      _isLaborious[place] = _isLaborious[place] || isLaborious(*at(place).expr);
+      _isLaborious[place] = _isLaborious[place] || isLaborious(*at(place).expr) || isWalked(place);
       const XQueryPlaceID whole = at(place).parent;
       if (whole != XQueryNoPlace && _isLaborious[place]) _isLaborious[whole] = true;
     }
@@ -92,6 +92,13 @@ class Search {
       default:
         return false;
     }
+  }
+
+  // Joins know the items of a clause again by the list that they stand in.
+  bool isWalked(XQueryPlaceID place) const {
+    if (at(place).role != XQueryRole::Bound) return false;
+    return at(place).expr->kind() == Kind::PathExpr &&
+           at(at(place).parent).expr->kind() != Kind::LetExpr;
   }
 
   bool isOpen(XQueryPlaceID place) const {

@@ -14,26 +14,43 @@
 #pragma once
 
 #include "Context/KeptValues.h"
-#include "Expr/Clauses/XQueryJoinCondition.h"
+#include "Expr/Operators/XQueryComparison.h"
 #include "Expr/Operators/XQueryUntypedText.h"
+#include "Expr/XQueryPicker.h"
+#include "Expr/XQuerySequence.h"
 #include "xquery/Object.h"
 
 #include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <optional>
+#include <span>
 #include <vector>
 
 namespace xquery {
 
+// How keys are compared with a probe.
+struct XQueryJoinRelation {
+  XQueryRelation relation{};  // of a key to a probe
+  // A value comparison wants one item on each side, a general one takes any number.
+  bool isValueComparison = false;
+  // "is": whether both sides are the same node.
+  bool isIdentity = false;
+  // There are several value comparisons, any of which may hold: one for each key, for each probe.
+  bool keysAreOfEach = false;
+  bool probesAreOfEach = false;
+  // The condition is that the relation does not hold, which is the same as another relation only
+  // where both sides are one item, and no NaN.
+  bool isComplement = false;
+};
+
+// a < b is b > a, and not (a < b) is not (b > a).
+XQueryRelation XQueryMirrored(XQueryRelation relation);
+
 class XQueryJoinTable final : public XQueryKeptValue {
  public:
-  struct Match {
-    uint32_t position;  // of the item, counted from 0
-    bool isSure;        // the comparison holds; otherwise it has to be asked
-    bool operator==(const Match&) const = default;
-  };
-  using Selection = std::vector<Match>;
+  using Selection = std::vector<XQueryPick>;
   // The value of the key for the item at a position; null when it cannot be had.
   using KeyReader = std::function<Value(size_t position)>;
 
@@ -46,8 +63,7 @@ class XQueryJoinTable final : public XQueryKeptValue {
   static constexpr size_t keysOfAnyItems = size_t{1} << 18;
 
   // The positions count the items, which the table keeps alive.
-  XQueryJoinTable(const XQueryJoinCondition& condition, std::vector<Value> items,
-                  const KeyReader& keyOf);
+  XQueryJoinTable(const XQueryJoinRelation& by, std::vector<Value> items, const KeyReader& keyOf);
   ~XQueryJoinTable() override;
 
   // Whether it holds all keys. It does not when they are too many, or would take too much of the
@@ -57,8 +73,12 @@ class XQueryJoinTable final : public XQueryKeptValue {
 
   // Puts the items that meet the comparison with the probe, and those that have to be asked, into
   // the list, in the order of the items, each once. False for a probe that has to be compared the
-  // plain way. Not for several threads at once: the table is completed by what it is asked.
-  bool select(const Value& probe, Selection& selection);
+  // plain way. Not for several threads at once: the table is completed by what it is asked. With
+  // `wantsFirst`, sure items behind the first one may be left out.
+  bool select(const Value& probe, Selection& selection, bool wantsFirst = false);
+  // Whether any item meets the comparison with the probe; nothing when it has to be compared the
+  // plain way.
+  std::optional<bool> meets(const Value& probe);
 
  private:
   // What a key or a probe is compared as.
@@ -72,6 +92,7 @@ class XQueryJoinTable final : public XQueryKeptValue {
     bool isText() const { return kind == Untyped || kind == Text; }
     bool isDecimal() const { return kind == ExactDecimal || kind == InexactDecimal; }
     bool isNumber() const { return kind == Floating || isDecimal(); }
+    bool isNaN() const;
     // Makes an untyped one a number; false when it begins with none.
     bool scan();
   };
@@ -93,21 +114,50 @@ class XQueryJoinTable final : public XQueryKeptValue {
     std::vector<uint32_t> _next;
   };
 
+  // Keys by their order, least first; without those that meet nothing.
+  struct Order {
+    std::vector<uint32_t> keys;
+    uint32_t asked = 0;
+  };
+
   void readKeys(const KeyReader& keyOf);
   void read(uint32_t position, const Value& value);
+  bool readNode(uint32_t position, const XQueryItemList& keys);
+  bool selectNode(const XQueryItemList& probes, Selection& selection);
   bool isTooLarge(int64_t bytesBefore) const;
   bool takes(const Operands& keys);
-  bool comparesAsNumbers(const Operands& probes) const;
+  // How the keys are compared with certain probes. Decimals that are equal as doubles need not be
+  // equal, which leaves it open what they meet.
+  enum class Way : uint8_t { Plain, Nothing, Texts, Numbers, NumbersButTies };
+  struct Asked {
+    bool areTiesOpen;
+    bool wantsFirst;
+  };
+  Way wayFor(const Value& probe, Operands& probes) const;
+  Way wayOfNumbers(const Operands& probes) const;
   void scanTexts();
-  void selectByText(const Operands& probes, Selection& selection);
-  void selectByNumber(const Operands& probes, Selection& selection);
-  template <class Key, class HashOf>
-  void selectBy(const std::vector<Key>& keys, std::vector<Key> probes, Chains& chains,
-                HashOf hashOf, Selection& selection);
+  void readTexts();
+  static std::vector<NSStringView> textsOf(const Operands& probes);
+  static std::vector<double> numbersOf(const Operands& probes);
+  // Calls visit(key, isTie) for each key that meets one of the probes, or is a tie with one, until
+  // it answers false.
+  template <class Key, class HashOf, class Visit>
+  void forEachMet(const std::vector<Key>& keys, std::vector<Key> probes, Chains& chains,
+                  HashOf hashOf, Asked asked, Visit visit);
+  template <class Key, class Visit>
+  void forEachOrdered(const std::vector<Key>& keys, const Key& probe, Order& order, Asked asked,
+                      Visit visit);
+  template <class Key>
+  static std::span<const uint32_t> metInOrder(XQueryRelation relation, const std::vector<Key>& keys,
+                                              const Key& probe, Order& order);
   void countMemory();
 
   const XQueryRelation _relation;
   const bool _isValueComparison;
+  const bool _isComplement;
+  const bool _isIdentity;
+  const bool _wantsOneKey;
+  const bool _wantsOneProbe;
   bool _isComplete = true;
   bool _holdsTexts = false;    // the keys are untyped or texts ...
   bool _holdsNumbers = false;  // ... or numbers; neither while there is no key
@@ -123,8 +173,12 @@ class XQueryJoinTable final : public XQueryKeptValue {
   std::vector<uint32_t> _irregularAsNumbers;
   std::vector<NSStringView> _texts;  // of each key
   std::vector<double> _numbers;      // of each key; NaN for one that is none
+  std::vector<Value> _nodes;         // instead, where nodes are looked for
+  Chains _nodeChains;
   Chains _textChains;
   Chains _numberChains;
+  Order _textOrder;
+  Order _numberOrder;
 };
 
 }  // namespace xquery

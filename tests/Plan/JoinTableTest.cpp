@@ -1,5 +1,5 @@
-#include "Expr/Clauses/XQueryJoinTable.h"
 #include "Functions/FunctionsTesting.h"
+#include "Plan/Joins/XQueryJoinTable.h"
 
 #include <gtest/gtest.h>
 
@@ -18,9 +18,9 @@ using functiontest::sequence;
 using functiontest::string;
 using functiontest::untyped;
 
-XQueryJoinCondition condition(XQueryRelation::Test test, bool negated = false,
-                              bool isValueComparison = false) {
-  XQueryJoinCondition made;
+XQueryJoinRelation condition(XQueryRelation::Test test, bool negated = false,
+                             bool isValueComparison = false) {
+  XQueryJoinRelation made;
   made.relation = {test, negated};
   made.isValueComparison = isValueComparison;
   return made;
@@ -28,7 +28,7 @@ XQueryJoinCondition condition(XQueryRelation::Test test, bool negated = false,
 
 // The positions that a table of the keys selects, those that have to be asked with a "?"; "plain"
 // for the plain way. A null key stands for one that cannot be read.
-std::string selected(const XQueryJoinCondition& by, const std::vector<Value>& keys,
+std::string selected(const XQueryJoinRelation& by, const std::vector<Value>& keys,
                      const Value& probe) {
   XQueryJoinTable table(by, keys, [&](size_t position) { return keys[position]; });
   XQueryJoinTable::Selection selection;
@@ -53,6 +53,35 @@ TEST(JoinTable, TextsMeetEqualTexts) {
 TEST(JoinTable, AnItemOfManyKeysIsSelectedOnce) {
   const std::vector<Value> keys = {sequence({untyped("a"), untyped("b")}), untyped("b")};
   EXPECT_EQ(selected(condition(equal), keys, sequence({untyped("b"), untyped("a")})), "0 1");
+}
+
+// Sorted keys, once there have been enough probes, select what looking at each key does.
+TEST(JoinTable, ManyProbesFindTheSameByTheOrderOfTheKeys) {
+  std::vector<Value> texts;
+  std::vector<Value> numbers;
+  for (int i = 0; i < 200; ++i) {
+    const int value = i * 37 % 100;
+    texts.push_back(untyped(std::to_string(value)));
+    numbers.push_back(i % 9 == 4 ? nan() : number(value));
+  }
+  for (const auto test : {less, XQueryRelation::Greater}) {
+    for (const bool negated : {false, true}) {
+      for (const auto* keys : {&texts, &numbers}) {
+        XQueryJoinTable table(condition(test, negated), *keys,
+                              [&](size_t position) { return (*keys)[position]; });
+        for (int probe = -1; probe <= 100; ++probe) {
+          XQueryJoinTable::Selection selection;
+          XQueryJoinTable::Selection fresh;
+          XQueryJoinTable other(condition(test, negated), *keys,
+                                [&](size_t position) { return (*keys)[position]; });
+          ASSERT_TRUE(table.select(number(probe), selection));
+          ASSERT_TRUE(other.select(number(probe), fresh));
+          EXPECT_EQ(selection, fresh) << test << negated << probe;
+          EXPECT_EQ(table.meets(number(probe)), !fresh.empty());
+        }
+      }
+    }
+  }
 }
 
 // As pairs they would fill gigabytes.
@@ -94,11 +123,26 @@ TEST(JoinTable, NaNMeetsNothing) {
   EXPECT_EQ(selected(condition(equal), {number(1), nan()}, nan()), "");
 }
 
-TEST(JoinTable, DecimalsThatAreNoDoublesAreComparedThePlainWay) {
+// Decimals that are one double may differ.
+TEST(JoinTable, DecimalsThatAreNoDoublesAreAskedWhereTheDoublesAreEqual) {
   const std::vector<Value> keys = {integer(9007199254740993), integer(1)};
-  EXPECT_EQ(selected(condition(equal), keys, integer(1)), "plain");
+  EXPECT_EQ(selected(condition(equal), keys, integer(1)), "1?");
   EXPECT_EQ(selected(condition(equal), keys, number(1)), "1");
-  EXPECT_EQ(selected(condition(equal), {integer(1)}, integer(9007199254740993)), "plain");
+  EXPECT_EQ(selected(condition(equal), {integer(1)}, integer(9007199254740993)), "");
+  EXPECT_EQ(selected(condition(less), keys, integer(9007199254740992)), "0? 1");
+  EXPECT_EQ(selected(condition(less), keys, integer(9007199254740999)), "0 1");
+  EXPECT_EQ(selected(condition(less, true), keys, integer(9007199254740992)), "0?");
+  XQueryJoinTable table(condition(equal), keys, [&](size_t position) { return keys[position]; });
+  EXPECT_EQ(table.meets(integer(9007199254740992)), std::nullopt);
+  EXPECT_EQ(table.meets(integer(7)), false);
+}
+
+TEST(JoinTable, TheFirstSureItemIsEnoughWhereThatIsAskedFor) {
+  const std::vector<Value> keys = {number(9), boolean(true), number(2), number(1), number(1)};
+  XQueryJoinTable table(condition(less), keys, [&](size_t position) { return keys[position]; });
+  XQueryJoinTable::Selection selection;
+  EXPECT_TRUE(table.select(number(3), selection, true));
+  EXPECT_EQ(selection, (XQueryJoinTable::Selection{{1, false}, {2, true}}));
 }
 
 TEST(JoinTable, KeysThatCannotBeReadOrMixKindsAreAsked) {
@@ -120,6 +164,13 @@ TEST(JoinTable, AValueComparisonTakesOneKeyAndOneProbe) {
             "0? 1");
   EXPECT_EQ(selected(eq, {untyped("a")}, sequence({string("a"), string("b")})), "plain");
   EXPECT_EQ(selected(eq, {untyped("1")}, integer(1)), "plain");
+  auto ofEach = eq;
+  ofEach.keysAreOfEach = true;
+  EXPECT_EQ(selected(ofEach, {sequence({untyped("a"), untyped("b")}), untyped("a")}, string("a")),
+            "0 1");
+  EXPECT_EQ(selected(ofEach, {untyped("a")}, sequence({string("a"), string("b")})), "plain");
+  ofEach.probesAreOfEach = true;
+  EXPECT_EQ(selected(ofEach, {untyped("a")}, sequence({string("a"), string("b")})), "0");
 }
 
 }  // namespace

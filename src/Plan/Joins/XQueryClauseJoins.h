@@ -1,0 +1,58 @@
+// Gives the clauses of a FLWOR or a quantifier that can be joined their joins.
+#pragma once
+
+#include "Expr/XQueryBinding.h"
+#include "Plan/Joins/XQueryJoinCondition.h"
+#include "Plan/Planning.h"
+
+#include <cstddef>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace xquery {
+
+class XQueryClauseJoins {
+ public:
+  // What is asked once all clauses have set their variables: the items of a clause are picked for
+  // which it may hold, or for which it may not hold.
+  enum class Picks : uint8_t { WhereItHolds, WhereItFails };
+
+  // The places of the clauses, and of the condition.
+  XQueryClauseJoins(XQueryPlanning& planning, std::vector<XQueryPlaceID> clauses,
+                    XQueryPlaceID condition, Picks picks)
+      : _planning(planning), _clauses(std::move(clauses)), _condition(condition), _picks(picks) {}
+
+  void join() {
+    for (size_t index = 0; index < _clauses.size(); ++index) joinClause(index);
+  }
+
+ private:
+  const XQueryPlace& at(XQueryPlaceID place) const { return _planning.program[place]; }
+  const XQueryFacts& facts(XQueryPlaceID place) const { return _planning.facts[place]; }
+  const XQueryBindingExpr& clauseAt(size_t index) const {
+    return *cast<XQueryBindingExpr>(at(_clauses[index]).expr);
+  }
+  XQueryPlaceID boundAt(size_t index) const {
+    return _planning.program.part(_clauses[index], XQueryRole::Bound);
+  }
+  struct Later {
+    std::vector<XQueryJoinClause> following;
+    // What must not fail, though it is evaluated for no item that is left out.
+    std::vector<Ref<XQueryExpr>> needed;
+    XQueryVariableSet leftovers;  // variables that are left with something else
+    std::string_view obstacle;    // why no item can be left out
+  };
+
+  Later clausesBehind(size_t index, XQueryJoinScope& scope) const;
+  bool walksItems(size_t index) const;
+  bool mayFollow(size_t index, size_t later) const;
+  void joinClause(size_t index);
+
+  XQueryPlanning& _planning;
+  const std::vector<XQueryPlaceID> _clauses;
+  const XQueryPlaceID _condition;
+  const Picks _picks;
+};
+
+}  // namespace xquery

@@ -1,0 +1,101 @@
+// The comparison by which a where clause, a quantifier or a predicate picks items: one operand, the
+// key, is read from the item, the other one, the probe, is the same for all items of one round.
+#pragma once
+
+#include "Expr/XQueryExpr.h"
+#include "Plan/Joins/XQueryJoinKeys.h"
+#include "Plan/Joins/XQueryJoinTable.h"
+#include "Plan/Planning.h"
+
+#include <utility>
+#include <vector>
+
+namespace xquery {
+
+// What an expression reads while items are picked.
+enum class XQueryJoinReads : uint8_t {
+  Item,     // the item and nothing else
+  Round,    // anything but the item
+  Unknown,  // both, or it is not repeatable
+};
+
+// How the items are known to what reads them.
+struct XQueryJoinScope {
+  bool isFocus = false;       // the item is the context item; otherwise
+  XQueryVariableSet item;     // variables that hold the item, or what follows from it alone
+  XQueryVariableSet settled;  // variables that are set anew for each item, these included
+
+  XQueryJoinReads readsOf(const XQueryFacts& facts) const;
+};
+
+struct XQueryJoinCondition {
+  Ref<XQueryExpr> key;  // null when there is no such comparison
+  Ref<XQueryExpr> probe;
+  XQueryJoinRelation relation;
+  // How much it promises to exclude; 0 for none.
+  int promise = 0;
+  // The comparison, filters and guards are the whole condition.
+  bool isWhole = false;
+  // The conditions before the comparison, all joined by "and": those that read the item only, and
+  // those that do not read it.
+  std::vector<Ref<XQueryExpr>> filters;
+  std::vector<Ref<XQueryExpr>> guards;
+  // What would be evaluated for an item that is left out, and must not fail: what reads the item
+  // only, and what does not read it.
+  std::vector<Ref<XQueryExpr>> checks;
+  std::vector<Ref<XQueryExpr>> needed;
+  // Key and filters look outside the item.
+  bool looksOutOfItems = false;
+  // What those of the probe and the guards read that look outside the nodes they start from.
+  std::vector<XQueryFacts> outward;
+  // Local variables that evaluating any of this sets.
+  XQueryVariableSet assigns;
+};
+
+// Finds the comparisons of a condition.
+class XQueryJoinSearch {
+ public:
+  XQueryJoinSearch(const XQueryPlanning& planning, XQueryJoinScope scope,
+                   std::vector<XQueryJoinClause> clauses)
+      : _planning(planning), _scope(scope), _clauses(std::move(clauses)) {}
+
+  // Of several comparisons joined by "and" the one that promises to exclude most. An item that it
+  // excludes is excluded by the whole condition: where an error excludes as well (`errorExcludes`)
+  // because what stands before it is repeatable and what stands behind it cannot tell whether there
+  // was an error, and otherwise because what stands before it reads the item only, or does not read
+  // it, or cannot fail.
+  XQueryJoinCondition conditionIn(XQueryPlaceID place, bool errorExcludes) const;
+  // The same where the items are picked for which the condition may not hold.
+  XQueryJoinCondition complementIn(XQueryPlaceID place) const;
+
+ private:
+  struct Comparison;
+
+  const XQueryPlace& at(XQueryPlaceID place) const { return _planning.program[place]; }
+  const XQueryFacts& facts(XQueryPlaceID place) const { return _planning.facts[place]; }
+  std::vector<XQueryPlaceID> conjuncts(XQueryPlaceID condition) const;
+  Comparison comparisonAt(XQueryPlaceID place) const;
+  struct Operand {
+    Ref<XQueryExpr> expr;
+    XQueryFacts facts;
+  };
+  static Comparison comparisonOf(int operatorType, Operand left, Operand right,
+                                 const XQueryJoinScope& scope);
+  Comparison operandsAt(XQueryPlaceID place, const XQueryJoinScope& scope) const;
+  Comparison comparisonOfCall(XQueryPlaceID place) const;
+  Comparison comparisonOfPath(XQueryPlaceID place) const;
+  bool describePartOfCall(XQueryPlaceID call, XQueryPlaceID body, XQueryPlaceID part,
+                          Operand& operand) const;
+  Comparison comparisonOfSome(XQueryPlaceID place) const;
+  bool cannotFail(XQueryPlaceID place) const;
+  bool passComparison(XQueryPlaceID place, const XQueryJoinScope& scope,
+                      XQueryJoinCondition& before) const;
+  std::vector<XQueryJoinClause> clausesBefore(const XQueryFacts& key) const;
+  XQueryJoinCondition made(const Comparison& comparison) const;
+
+  const XQueryPlanning& _planning;
+  const XQueryJoinScope _scope;
+  const std::vector<XQueryJoinClause> _clauses;
+};
+
+}  // namespace xquery

@@ -1,0 +1,488 @@
+#include "Plan/Joins/XQueryJoinTable.h"
+
+#include "Expr/XQuerySequence.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Types/XQueryAtomization.h"
+#include "Types/XQueryTypeTable.h"
+#include "xquery/Number.h"
+#include "xquery/XMLNode.h"
+
+#include <algorithm>
+#include <bit>
+#include <cmath>
+#include <functional>
+#include <limits>
+#include <type_traits>
+
+namespace xquery {
+namespace {
+
+// Every integer below this magnitude is a double and no other integer is the same double.
+constexpr double exactIntegerBound = 1LL << std::numeric_limits<double>::digits;
+constexpr double notANumber = std::numeric_limits<double>::quiet_NaN();
+
+// NaN, whichever way it is stored, meets nothing.
+bool isFloating(const NSNumber& number) {
+  return std::isnan(number.doubleValue()) || number.storage() == NSNumber::Storage::Double ||
+         number.storage() == NSNumber::Storage::Float;
+}
+
+bool isExactAsDouble(const NSNumber& number) {
+  const NSDecimal* decimal = number.storedDecimal();
+  if (decimal && !decimal->isSmallInteger()) return false;
+  return std::abs(number.doubleValue()) < exactIntegerBound;
+}
+
+uint32_t hashOfDouble(double value) {
+  // The two zeros are equal.
+  const auto bits = std::bit_cast<uint64_t>(value == 0 ? 0.0 : value);
+  return static_cast<uint32_t>((bits * 0x9E3779B97F4A7C15U) >> 32U);
+}
+
+uint32_t hashOfNode(const NSObject* node) {
+  return static_cast<uint32_t>((reinterpret_cast<uintptr_t>(node) * 0x9E3779B97F4A7C15U) >> 32U);
+}
+
+uint32_t hashOfText(NSStringView text) {
+  return text.hash();
+}
+
+int orderOf(double a, double b) {
+  return a < b ? -1 : a > b ? 1 : 0;
+}
+int orderOf(NSStringView a, NSStringView b) {
+  return a.compare(b);
+}
+bool isEqual(double a, double b) {
+  return a == b;
+}
+bool isEqual(NSStringView a, NSStringView b) {
+  return a.equals(b);
+}
+bool meetsNothing(double key) {
+  return std::isnan(key);
+}
+bool meetsNothing(NSStringView) {
+  return false;
+}
+
+// What holds for an order relation, and for equal values.
+XQueryRelation withTies(XQueryRelation relation) {
+  if (relation.negated) return relation;
+  return {relation.test == XQueryRelation::Less ? XQueryRelation::Greater : XQueryRelation::Less,
+          true};
+}
+
+// Of several probes of an order relation one decides: what is below any is below the greatest.
+template <class Key>
+Key decidingProbe(XQueryRelation relation, const std::vector<Key>& probes) {
+  const auto below = [](const Key& a, const Key& b) { return orderOf(a, b) < 0; };
+  const bool wantsGreatest = (relation.test == XQueryRelation::Less) != relation.negated;
+  return wantsGreatest ? *std::max_element(probes.begin(), probes.end(), below)
+                       : *std::min_element(probes.begin(), probes.end(), below);
+}
+
+// So that every key is found once.
+template <class Key>
+void keepDistinct(std::vector<Key>& probes) {
+  if (probes.size() < 2) return;
+  WorkPacer pacer;
+  std::sort(probes.begin(), probes.end(), [&pacer](const Key& a, const Key& b) {
+    pacer.turn();
+    return orderOf(a, b) < 0;
+  });
+  const auto areEqual = [](const Key& a, const Key& b) { return isEqual(a, b); };
+  probes.erase(std::unique(probes.begin(), probes.end(), areEqual), probes.end());
+}
+
+// In the order of the items, each once; an item that has to be asked stays one.
+void arrange(XQueryJoinTable::Selection& selection) {
+  const auto before = [](const auto& a, const auto& b) {
+    return a.position != b.position ? a.position < b.position : a.isSure < b.isSure;
+  };
+  if (!std::is_sorted(selection.begin(), selection.end(), before)) {
+    std::sort(selection.begin(), selection.end(), before);
+  }
+  const auto isSameItem = [](const auto& a, const auto& b) { return a.position == b.position; };
+  selection.erase(std::unique(selection.begin(), selection.end(), isSameItem), selection.end());
+}
+
+}  // namespace
+
+XQueryRelation XQueryMirrored(XQueryRelation relation) {
+  if (relation.test == XQueryRelation::Less) {
+    relation.test = XQueryRelation::Greater;
+  } else if (relation.test == XQueryRelation::Greater) {
+    relation.test = XQueryRelation::Less;
+  }
+  return relation;
+}
+
+// --- operands ------------------------------------------------------------------------------------
+
+XQueryJoinTable::Operand::Operand(NSObject* item) {
+  if (!item) return;
+  const XQueryTypeID type =
+      item->isNode() ? XQueryTypeID{XQueryTypeUntypedAtomic} : XQueryObjectTypeID(item);
+  const XQueryTypeID primitive = XQueryPrimitiveTypeForTypeID(type);
+  if (type == XQueryTypeUntypedAtomic || type == XQueryTypeString) {
+    kind = type == XQueryTypeString ? Text : Untyped;
+    text = XQueryUntypedText(*item);
+  } else if (primitive >= XQueryTypeDouble && primitive <= XQueryTypeDecimal) {
+    const auto& value = *cast<NSNumber>(item);
+    number = value.doubleValue();
+    kind = isFloating(value) ? Floating : isExactAsDouble(value) ? ExactDecimal : InexactDecimal;
+  }
+}
+
+bool XQueryJoinTable::Operand::scan() {
+  return kind == Untyped ? scanDouble(text.view(), number) : isNumber();
+}
+
+bool XQueryJoinTable::Operand::isNaN() const {
+  return kind == Floating && std::isnan(number);
+}
+
+template <class HashOf>
+void XQueryJoinTable::Chains::build(size_t count, HashOf hashOf) {
+  _heads.assign(std::bit_ceil(2 * count + 1), end);
+  _next.assign(count, end);
+  WorkPacer pacer;
+  // From the last key on, so that a chain begins with the first one.
+  for (size_t key = count; key-- > 0;) {
+    pacer.turn();
+    uint32_t& head = _heads[hashOf(key) & (_heads.size() - 1)];
+    _next[key] = head;
+    head = static_cast<uint32_t>(key);
+  }
+}
+
+// --- filling -------------------------------------------------------------------------------------
+
+XQueryJoinTable::XQueryJoinTable(const XQueryJoinRelation& by, std::vector<Value> items,
+                                 const KeyReader& keyOf)
+    : _relation(by.relation),
+      _isValueComparison(by.isValueComparison),
+      _isComplement(by.isComplement),
+      _isIdentity(by.isIdentity),
+      _wantsOneKey(by.isValueComparison && !by.keysAreOfEach),
+      _wantsOneProbe(by.isValueComparison && !by.probesAreOfEach),
+      _items(std::move(items)) {
+  readKeys(keyOf);
+  countMemory();
+}
+
+XQueryJoinTable::~XQueryJoinTable() {
+  uncountValueBytes(static_cast<size_t>(_countedBytes));
+}
+
+void XQueryJoinTable::readKeys(const KeyReader& keyOf) {
+  const int64_t bytesBefore = workMeter.valueBytes;
+  for (size_t index = 0; index < _items.size() && _isComplete; ++index) {
+    checkWork();
+    read(static_cast<uint32_t>(index), keyOf(index));
+    _isComplete = !isTooLarge(bytesBefore);
+  }
+}
+
+// `bytesBefore`: what all values took before the first key was read.
+bool XQueryJoinTable::isTooLarge(int64_t bytesBefore) const {
+  if (_keys.size() > std::max(keysOfAnyItems, _items.size() * mostKeysPerItem)) return true;
+  // With both ways of finding it.
+  constexpr size_t bytesPerKey = sizeof(Operand) + sizeof(Value) + sizeof(NSStringView) +
+                                 sizeof(double) + 12 * sizeof(uint32_t);
+  constexpr int64_t part = 4;
+  const auto own = static_cast<int64_t>(_items.size() * sizeof(Value) + _keys.size() * bytesPerKey);
+  const int64_t keyBytes = workMeter.valueBytes - bytesBefore;
+  return own + keyBytes > workMeter.mostValueBytes / part - bytesBefore / part;
+}
+
+void XQueryJoinTable::read(uint32_t position, const Value& value) {
+  if (!value) return _irregular.push_back(position);
+  const XQueryItemList list(value.get());
+  if (_isIdentity) {
+    if (!readNode(position, list)) _irregular.push_back(position);
+    return;
+  }
+  Operands keys;
+  for (size_t i = 0; i < list.count(); ++i) keys.emplace_back(list[i]);
+  if (!takes(keys)) return _irregular.push_back(position);
+  for (size_t i = 0; i < keys.size(); ++i) {
+    if (_keys.size() == mostItems) throw std::bad_alloc();
+    if (!list[i]->isNode()) _keptKeys.emplace_back(list[i]);
+    _hasDecimals = _hasDecimals || keys[i].isDecimal();
+    _hasInexactDecimals = _hasInexactDecimals || keys[i].kind == Operand::InexactDecimal;
+    _keys.push_back(std::move(keys[i]));
+    _positions.push_back(position);
+  }
+}
+
+// Whether the item can be looked for by the node that is its key; without one it meets nothing.
+bool XQueryJoinTable::readNode(uint32_t position, const XQueryItemList& keys) {
+  if (keys.count() == 0) return true;
+  if (keys.count() > 1 || !keys[0]->isNode()) return false;
+  _nodes.emplace_back(keys[0]);
+  _positions.push_back(position);
+  return true;
+}
+
+// Whether the keys of an item are of the one kind that the table holds: that of its first key. An
+// item without keys meets nothing.
+bool XQueryJoinTable::takes(const Operands& keys) {
+  if (_isComplement && (keys.size() != 1 || keys.front().isNaN())) return false;
+  if (keys.empty()) return true;
+  if (_wantsOneKey && keys.size() > 1) return false;
+  const auto isText = [](const Operand& key) { return key.isText(); };
+  const auto isNumber = [](const Operand& key) { return key.isNumber(); };
+  const bool allTexts = std::all_of(keys.begin(), keys.end(), isText);
+  const bool allNumbers = std::all_of(keys.begin(), keys.end(), isNumber);
+  if (!_holdsTexts && !_holdsNumbers) {
+    _holdsTexts = allTexts;
+    _holdsNumbers = allNumbers;
+  }
+  return (_holdsTexts && allTexts) || (_holdsNumbers && allNumbers);
+}
+
+// Reads the keys as numbers. An item one of whose keys is none cannot be compared with a number.
+void XQueryJoinTable::scanTexts() {
+  if (_isScanned) return;
+  _isScanned = true;
+  _numbers.reserve(_keys.size());
+  for (size_t key = 0; key < _keys.size(); ++key) {
+    bool isNumber = _keys[key].scan();
+    if (_isComplement && std::isnan(_keys[key].number)) isNumber = false;
+    _numbers.push_back(isNumber ? _keys[key].number : notANumber);
+    if (!isNumber) _irregularAsNumbers.push_back(_positions[key]);
+  }
+}
+
+void XQueryJoinTable::countMemory() {
+  const size_t bytes = _items.size() * sizeof(Value) + _keptKeys.size() * sizeof(Value) +
+                       _keys.size() * sizeof(Operand) + _nodes.size() * sizeof(Value) +
+                       _nodeChains.bytes() +
+                       (_positions.size() + _irregular.size()) * sizeof(uint32_t) +
+                       _texts.size() * sizeof(NSStringView) + _numbers.size() * sizeof(double) +
+                       _textChains.bytes() + _numberChains.bytes() +
+                       (_textOrder.keys.size() + _numberOrder.keys.size()) * sizeof(uint32_t);
+  const int64_t more = static_cast<int64_t>(bytes) - _countedBytes;
+  if (more > 0) countValueBytes(static_cast<size_t>(more));
+  _countedBytes = std::max(_countedBytes, static_cast<int64_t>(bytes));
+}
+
+// --- asking --------------------------------------------------------------------------------------
+
+XQueryJoinTable::Way XQueryJoinTable::wayFor(const Value& probe, Operands& probes) const {
+  if (!probe) return Way::Plain;
+  const XQueryItemList list(probe.get());
+  if (_wantsOneProbe && list.count() > 1) return Way::Plain;
+  if (_isComplement && list.count() != 1) return Way::Plain;
+  WorkPacer pacer;
+  for (size_t i = 0; i < list.count(); ++i) {
+    pacer.turn();
+    probes.emplace_back(list[i]);
+    if (probes.back().kind == Operand::Other) return Way::Plain;
+    if (_isComplement && probes.back().isNaN()) return Way::Plain;
+  }
+  if (probes.empty() || _keys.empty()) return Way::Nothing;
+  const auto isText = [](const Operand& operand) { return operand.isText(); };
+  if (_holdsTexts && std::all_of(probes.begin(), probes.end(), isText)) return Way::Texts;
+  return wayOfNumbers(probes);
+}
+
+bool XQueryJoinTable::selectNode(const XQueryItemList& probes, Selection& selection) {
+  if (probes.count() > 1 || (probes.count() == 1 && !probes[0]->isNode())) return false;
+  if (probes.count() == 1 && !_nodes.empty()) {
+    const NSObject* probe = probes[0];
+    if (!_nodeChains.isBuilt()) {
+      _nodeChains.build(_nodes.size(), [&](size_t key) { return hashOfNode(_nodes[key].get()); });
+    }
+    for (uint32_t key = _nodeChains.first(hashOfNode(probe)); key != Chains::end;
+         key = _nodeChains.next(key)) {
+      if (_nodes[key].get() == probe) selection.push_back({_positions[key], true});
+    }
+  }
+  for (const uint32_t position : _irregular) selection.push_back({position, false});
+  arrange(selection);
+  countMemory();
+  return true;
+}
+
+bool XQueryJoinTable::select(const Value& probe, Selection& selection, bool wantsFirst) {
+  if (_isIdentity) return probe && selectNode(XQueryItemList(probe.get()), selection);
+  Operands probes;
+  const Way way = wayFor(probe, probes);
+  if (way == Way::Plain) return false;
+  const Asked asked = {way == Way::NumbersButTies, wantsFirst};
+  const auto choose = [&](size_t key, bool isTie) {
+    selection.push_back({_positions[key], !isTie});
+    return true;
+  };
+  if (way == Way::Texts) {
+    readTexts();
+    forEachMet(_texts, textsOf(probes), _textChains, hashOfText, asked, choose);
+  } else if (way != Way::Nothing) {
+    scanTexts();
+    for (const uint32_t position : _irregularAsNumbers) selection.push_back({position, false});
+    forEachMet(_numbers, numbersOf(probes), _numberChains, hashOfDouble, asked, choose);
+  }
+  for (const uint32_t position : _irregular) selection.push_back({position, false});
+  arrange(selection);
+  countMemory();
+  return true;
+}
+
+std::optional<bool> XQueryJoinTable::meets(const Value& probe) {
+  if (!_irregular.empty()) return std::nullopt;
+  Operands probes;
+  const Way way = wayFor(probe, probes);
+  if (way == Way::Plain) return std::nullopt;
+  const Asked asked = {way == Way::NumbersButTies, true};
+  bool areMet = false;
+  bool isOpen = false;
+  const auto find = [&](size_t, bool isTie) {
+    (isTie ? isOpen : areMet) = true;
+    return !areMet;
+  };
+  if (way == Way::Texts) {
+    readTexts();
+    forEachMet(_texts, textsOf(probes), _textChains, hashOfText, asked, find);
+  } else if (way != Way::Nothing) {
+    scanTexts();
+    if (!_irregularAsNumbers.empty()) return std::nullopt;
+    forEachMet(_numbers, numbersOf(probes), _numberChains, hashOfDouble, asked, find);
+  }
+  countMemory();
+  if (isOpen && !areMet) return std::nullopt;
+  return areMet;
+}
+
+// Whether every pair is compared by double, or as if it were. Two decimals are compared exactly,
+// which makes a difference where one of them is no double.
+XQueryJoinTable::Way XQueryJoinTable::wayOfNumbers(const Operands& probes) const {
+  Way way = Way::Numbers;
+  for (const Operand& probe : probes) {
+    switch (probe.kind) {
+      case Operand::Untyped: {  // a value comparison would make it a string
+        Operand scanned = probe;
+        const bool isNumber = _holdsNumbers && !_isValueComparison && scanned.scan() &&
+                              !(_isComplement && std::isnan(scanned.number));
+        if (!isNumber) return Way::Plain;
+        break;
+      }
+      case Operand::ExactDecimal:
+      case Operand::InexactDecimal: {
+        const bool isInexact = probe.kind == Operand::InexactDecimal;
+        if (isInexact ? _hasDecimals : _hasInexactDecimals) way = Way::NumbersButTies;
+        if (!_holdsNumbers && _isValueComparison) return Way::Plain;
+        break;
+      }
+      case Operand::Floating:
+        if (!_holdsNumbers && _isValueComparison) return Way::Plain;
+        break;
+      default:
+        return Way::Plain;
+    }
+  }
+  return way;
+}
+
+void XQueryJoinTable::readTexts() {
+  if (!_texts.empty()) return;
+  _texts.reserve(_keys.size());
+  for (const Operand& key : _keys) _texts.push_back(key.text.view());
+}
+
+std::vector<NSStringView> XQueryJoinTable::textsOf(const Operands& probes) {
+  std::vector<NSStringView> texts;
+  for (const Operand& probe : probes) texts.push_back(probe.text.view());
+  return texts;
+}
+
+// NaN meets nothing.
+std::vector<double> XQueryJoinTable::numbersOf(const Operands& probes) {
+  std::vector<double> numbers;
+  for (Operand probe : probes) {
+    probe.scan();
+    if (!std::isnan(probe.number)) numbers.push_back(probe.number);
+  }
+  return numbers;
+}
+
+// A few probes are compared with every key; for more of them the keys are sorted.
+template <class Key, class Visit>
+void XQueryJoinTable::forEachOrdered(const std::vector<Key>& keys, const Key& probe, Order& order,
+                                     Asked asked, Visit visit) {
+  constexpr uint32_t few = 16;
+  // So many are found in the order of the items as quickly as put into it.
+  constexpr size_t part = 16;
+  const XQueryRelation relation = asked.areTiesOpen ? withTies(_relation) : _relation;
+  const auto isTie = [&](size_t key) {
+    return asked.areTiesOpen && orderOf(keys[key], probe) == 0;
+  };
+  WorkPacer pacer;
+  if (order.asked < few) {
+    ++order.asked;
+  } else {
+    const auto met = metInOrder(relation, keys, probe, order);
+    if (met.size() < keys.size() / part) {
+      for (const uint32_t key : met) {
+        pacer.turn();
+        if (!visit(key, isTie(key))) return;
+      }
+      return;
+    }
+  }
+  for (size_t key = 0; key < keys.size(); ++key) {
+    pacer.turn();
+    if (meetsNothing(keys[key]) || !relation.holds(orderOf(keys[key], probe))) continue;
+    if (!visit(key, isTie(key)) || (asked.wantsFirst && !isTie(key))) return;
+  }
+}
+
+// The keys that meet a probe are the first ones in their order, or the last ones.
+template <class Key>
+std::span<const uint32_t> XQueryJoinTable::metInOrder(XQueryRelation relation,
+                                                      const std::vector<Key>& keys,
+                                                      const Key& probe, Order& order) {
+  std::vector<uint32_t>& sorted = order.keys;
+  if (sorted.empty()) {
+    for (size_t key = 0; key < keys.size(); ++key) {
+      if (!meetsNothing(keys[key])) sorted.push_back(static_cast<uint32_t>(key));
+    }
+    WorkPacer pacer;
+    std::sort(sorted.begin(), sorted.end(), [&](uint32_t a, uint32_t b) {
+      pacer.turn();
+      return orderOf(keys[a], keys[b]) < 0;
+    });
+  }
+  const bool fromLeast = (relation.test == XQueryRelation::Less) != relation.negated;
+  const auto border = std::partition_point(sorted.begin(), sorted.end(), [&](uint32_t key) {
+    return relation.holds(orderOf(keys[key], probe)) == fromLeast;
+  });
+  const std::span<const uint32_t> all(sorted);
+  const auto count = static_cast<size_t>(border - sorted.begin());
+  return fromLeast ? all.first(count) : all.subspan(count);
+}
+
+template <class Key, class HashOf, class Visit>
+void XQueryJoinTable::forEachMet(const std::vector<Key>& keys, std::vector<Key> probes,
+                                 Chains& chains, HashOf hashOf, Asked asked, Visit visit) {
+  if (probes.empty()) return;
+  if (_relation.test != XQueryRelation::Equal) {
+    Order& order = std::is_same_v<Key, double> ? _numberOrder : _textOrder;
+    return forEachOrdered(keys, decidingProbe(_relation, probes), order, asked, visit);
+  }
+  if (!chains.isBuilt()) {
+    chains.build(keys.size(), [&](size_t key) { return hashOf(keys[key]); });
+  }
+  keepDistinct(probes);
+  WorkPacer pacer;
+  for (const Key& probe : probes) {
+    for (uint32_t key = chains.first(hashOf(probe)); key != Chains::end; key = chains.next(key)) {
+      pacer.turn();
+      if (isEqual(keys[key], probe) && !visit(key, asked.areTiesOpen)) return;
+    }
+  }
+}
+
+}  // namespace xquery
