@@ -60,6 +60,54 @@ std::vector<Value> combine(int type, const Nodes& left, const Nodes& right) {
   return result;
 }
 
+// Whether the nodes stand in document order, none twice, and all in one tree.
+bool areInOrder(const Nodes& nodes) {
+  WorkPacer pacer;
+  const NSXMLNode* previous = nullptr;
+  for (const NSObject* each : nodes) {
+    pacer.turn();
+    const auto* node = cast<NSXMLNode>(each);
+    if (previous && !(NSXMLNode::haveComparableOrder(previous, node) &&
+                      previous->orderNumber() < node->orderNumber())) {
+      return false;
+    }
+    previous = node;
+  }
+  return true;
+}
+
+bool areOfOneTree(const Nodes& left, const Nodes& right) {
+  return left.empty() || right.empty() ||
+         NSXMLNode::haveComparableOrder(cast<NSXMLNode>(left.front()),
+                                        cast<NSXMLNode>(right.front()));
+}
+
+// The same for nodes in order, whose result is in order without being sorted.
+std::vector<Value> merge(int type, const Nodes& left, const Nodes& right) {
+  const bool takesRight = type == XQueryOperatorUnion;
+  const bool takesBoth = type != XQueryOperatorExcept;
+  const bool takesLeft = type != XQueryOperatorIntersect;
+  std::vector<Value> result;
+  WorkPacer pacer;
+  const auto numberOf = [](const NSObject* node) { return cast<NSXMLNode>(node)->orderNumber(); };
+  size_t index = 0;
+  const auto takeRightBefore = [&](uint32_t number) {
+    for (; index < right.size() && numberOf(right[index]) < number; ++index) {
+      pacer.turn();
+      if (takesRight) result.emplace_back(right[index]);
+    }
+  };
+  for (NSObject* node : left) {
+    pacer.turn();
+    takeRightBefore(numberOf(node));
+    const bool isInBoth = index < right.size() && right[index] == node;
+    if (isInBoth) ++index;
+    if (isInBoth ? takesBoth : takesLeft) result.emplace_back(node);
+  }
+  takeRightBefore(UINT32_MAX);
+  return result;
+}
+
 }  // namespace
 
 Value XQueryOperatorExpr::sequenceOperatorEvaluate(int type, const Value& withLeft,
@@ -67,10 +115,13 @@ Value XQueryOperatorExpr::sequenceOperatorEvaluate(int type, const Value& withLe
   Nodes leftNodes;
   Nodes rightNodes;
   if (!gatherNodes(withLeft, leftNodes) || !gatherNodes(right, rightNodes)) return Value();
-  std::vector<Value> nodes = combine(type, leftNodes, rightNodes);
+  const bool canMerge =
+      areInOrder(leftNodes) && areInOrder(rightNodes) && areOfOneTree(leftNodes, rightNodes);
+  std::vector<Value> nodes =
+      canMerge ? merge(type, leftNodes, rightNodes) : combine(type, leftNodes, rightNodes);
   if (nodes.empty()) return NSNull::null();
   if (nodes.size() == 1) return nodes.front();
-  XQuerySortNodesForwardStable(nodes);
+  if (!canMerge) XQuerySortNodesForwardStable(nodes);
   const Ref<XQuerySequence> sequence = XQuerySequence::sequence();
   sequence->objects() = std::move(nodes);
   return sequence;
