@@ -81,8 +81,14 @@ void XQueryFactsOfVariable(const XQueryFactsAt& at, XQueryFacts& facts) {
 XQueryFacts XQueryFactsAt::itemOfFocus(XQueryPlaceID focus) const {
   if (focus == XQueryNoPlace) return {};
   const XQueryPlace& setter = program[focus];
-  // What reaches a later filter step are nodes.
-  if (setter.role == XQueryRole::Step) return XQueryFacts::one(XQueryItems::Node);
+  if (setter.role == XQueryRole::Step) {
+    // What reaches a later filter step are nodes, but for the items of the first step.
+    const XQueryStep* first = cast<XQueryPathExpr>(program[setter.parent].expr)->step();
+    const bool areNodes = isa<XQueryAxisStep>(first) || first->next() != setter.step;
+    if (areNodes) return XQueryFacts::one(XQueryItems::Node);
+    const XQueryFacts item = oneItemOf(table[program.part(setter.parent, XQueryRole::FirstStep)]);
+    return item.are(XQueryItems::Node) ? XQueryFacts::one(XQueryItems::Node) : item;
+  }
   if (const auto* step = dyn_cast<XQueryAxisStep>(setter.step)) {
     return XQueryFacts::one(XQueryKindsOfStep(*step));
   }
