@@ -111,7 +111,10 @@ std::string labelOfAxisStep(const XQueryAxisStep& step) {
                                                      "preceding-sibling::",
                                                      "ancestor-or-self::"};
   if (step.axis() == XQueryAxisParent && isAnyNode(step)) return "..";
-  return std::string(axes.at(static_cast<size_t>(step.axis()))) + labelOfTest(step.expr());
+  // In the place of a union of steps.
+  const bool isUnion = step.choice() && step.predicatesInTest() == 0;
+  return std::string(axes.at(static_cast<size_t>(step.axis()))) +
+         (isUnion ? textOf(step.choice()->description()) : labelOfTest(step.expr()));
 }
 
 // What a filter step filters stands below as a part of its own, unless it is brief.

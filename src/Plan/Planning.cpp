@@ -76,6 +76,10 @@ void XQueryPlanning::wrap(XQueryPlaceID place, Ref<XQueryExpr> by, std::string_v
 void XQueryPlanning::replace(XQueryPlaceID place, Ref<XQueryExpr> by, std::string_view reason) {
   choose(place, reason);
   program.replace(place, std::move(by));
+  leaveOut(place);
+}
+
+void XQueryPlanning::leaveOut(XQueryPlaceID place) {
   std::fill(_states.begin() + place, _states.begin() + program[place].end, State::Gone);
 }
 

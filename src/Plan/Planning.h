@@ -65,6 +65,9 @@ class XQueryPlanning {
     _notes = notes;
   }
 
+  // What is written in the place is evaluated no more: what is around it does its work.
+  void leaveOut(XQueryPlaceID place);
+
   XQueryProgram& program;
   const XQueryFactTable facts;
 

@@ -2,6 +2,7 @@
 
 #include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Clauses/XQueryQuantified.h"
+#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQueryLeaves.h"
 #include "Platform/Base/WorkMeter.h"
@@ -201,6 +202,10 @@ bool XQueryProgram::isSurelySet(XQueryPlaceID variable) const {
   const XQueryPlaceID whole = _places[binder].parent;
   const auto& items = cast<XQueryQuantifiedExpr>(_places[whole].expr)->items();
   return variable < _places[whole].end && _places[binder].expr == items.back().get();
+}
+
+void XQueryProgram::keep(Ref<XQueryStep> step) {
+  _replacedSteps.emplace_back(std::move(step));
 }
 
 Ref<XQueryExpr> XQueryProgram::install() {

@@ -97,6 +97,8 @@ class XQueryProgram {
   void replace(XQueryPlaceID place, Ref<XQueryExpr> expr) {
     _replaced.push_back(std::exchange(*_places[place].slot, std::move(expr)));
   }
+  // Keeps a step that was taken out of its path for as long as places refer to it.
+  void keep(Ref<XQueryStep> step);
   // Hands the bodies back to the declarations; the body of the query is the answer.
   Ref<XQueryExpr> install();
 
@@ -106,6 +108,7 @@ class XQueryProgram {
   friend class XQueryProgramReader;
 
   std::vector<Ref<XQueryExpr>> _replaced;
+  std::vector<Ref<NSCounted>> _replacedSteps;
   std::vector<XQueryProgramBody> _bodies;
   std::vector<XQueryPlace> _places;
   std::vector<XQueryPlaceID> _partsFirst;

@@ -6,6 +6,10 @@ namespace xquery {
 namespace {
 
 constexpr std::array rules = {
+    XQueryRule{"name tests", "a filter or a union of names becomes the test of one step",
+               XQueryTakeNames},
+    XQueryRule{"positions", "a position that is compared with a number is asked for by number",
+               XQueryTakePositions},
     XQueryRule{"constants", "what consists of literals alone is evaluated once, beforehand",
                XQueryFoldConstants},
     XQueryRule{"names", "comparing name() or local-name() with a constant makes no string",
@@ -14,6 +18,12 @@ constexpr std::array rules = {
                XQueryKeepInvariants},
     XQueryRule{"sets", "the items of a long side of a comparison are found by their values",
                XQueryCompareWithSets},
+    XQueryRule{"counts", "nodes are counted, or found to be there, without a list of them",
+               XQueryCountPaths},
+    XQueryRule{"first", "of a path whose first nodes are asked for, no more is walked",
+               XQueryTakeFirst},
+    XQueryRule{"members", "whether one node is in a large set is looked up in a table",
+               XQueryAskMembers},
     XQueryRule{"texts", "comparing children and attributes with a constant makes no values",
                XQueryCompareConstants},
     XQueryRule{"short paths", "what a few steps find from one node is taken as it comes",

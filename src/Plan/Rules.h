@@ -23,12 +23,17 @@ struct XQueryRule {
 std::span<const XQueryRule> XQueryRules();
 
 void XQueryFoldConstants(XQueryPlanning& planning);
+void XQueryTakeNames(XQueryPlanning& planning);
+void XQueryTakePositions(XQueryPlanning& planning);
 void XQueryCompareNames(XQueryPlanning& planning);
 void XQueryKeepInvariants(XQueryPlanning& planning);
 void XQueryCompareWithSets(XQueryPlanning& planning);
 void XQueryJoinForClauses(XQueryPlanning& planning);
 void XQueryJoinQuantifiers(XQueryPlanning& planning);
 void XQueryJoinSteps(XQueryPlanning& planning);
+void XQueryCountPaths(XQueryPlanning& planning);
+void XQueryTakeFirst(XQueryPlanning& planning);
+void XQueryAskMembers(XQueryPlanning& planning);
 void XQueryCompareConstants(XQueryPlanning& planning);
 void XQueryShortenPaths(XQueryPlanning& planning);
 

@@ -12,11 +12,16 @@ class ProgramGenerator {
  public:
   explicit ProgramGenerator(unsigned seed) : _random(seed) {}
 
-  // Elements a, b, c with attributes x and y, small numbers and words for texts.
+  // Elements a, b, c, some in a namespace, with attributes x and y, small numbers and words for
+  // texts, instructions with such names. Some documents are large enough to be indexed.
   std::string document() {
-    std::string text = "<a>";
+    std::string text = "<a xmlns:p='urn:p'>";
     const size_t count = 2 + _random.below(5);
     for (size_t i = 0; i < count; ++i) text += element(3);
+    if (_random.below(4) == 0) {
+      for (size_t i = 0; i < nodesOfIndexedTree; ++i) text += "<!---->";
+      text += element(3);
+    }
     return text + "</a>";
   }
 
@@ -32,8 +37,10 @@ class ProgramGenerator {
   }
 
  private:
+  static constexpr size_t nodesOfIndexedTree = 260;
+
   std::string element(int depth) {
-    const std::string name = _random.oneOf({"a", "b", "c"});
+    const std::string name = _random.oneOf({"a", "b", "c", "a", "b", "c", "a", "p:a"});
     std::string text = "<" + name;
     if (_random.below(2)) text += " x='" + word() + "'";
     if (_random.below(3) == 0) text += " y='" + word() + "'";
@@ -41,6 +48,7 @@ class ProgramGenerator {
     const size_t count = depth == 0 ? 0 : _random.below(4);
     for (size_t i = 0; i < count; ++i) text += element(depth - 1);
     if (count == 0) text += word();
+    if (_random.below(16) == 0) text += "<?a b?>";
     return text + "</" + name + ">";
   }
 
@@ -78,21 +86,75 @@ class ProgramGenerator {
   }
 
   std::string predicate(int depth) {
-    switch (_random.below(8)) {
+    switch (_random.below(10)) {
       case 0:
-        return "[" + _random.oneOf({"1", "2", "last()", "position() < 3"}) + "]";
+        return "[" + _random.oneOf({"1", "2", "last()", "position() < 3", "position() = 1"}) + "]";
       case 1:
         return "[" + _random.oneOf({"@x", "b", "c/a", "not(@y)"}) + "]";
       case 2:
-        return "[" + _random.oneOf({"name()", "local-name(.)", "name(.)"}) +
-               _random.oneOf({" = ", " eq ", " != "}) + _random.oneOf({"'a'", "'b'", "'x'"}) + "]";
+        return "[" + nameCondition() + "]";
+      case 3:
+        return "[" + existence(depth - 1) + "]";
+      case 4:
+        return "[" + membership(depth - 1) + "]";
       default:
         return "[" + comparison(depth - 1) + "]";
     }
   }
 
+  std::string nameCondition() {
+    const std::string condition = _random.oneOf({"name()", "local-name(.)", "name(.)"}) +
+                                  _random.oneOf({" = ", " = ", " eq ", " != "}) +
+                                  _random.oneOf({"'a'", "'b'", "'x'", "'p:a'", "('a', 'c')"});
+    switch (_random.below(4)) {
+      case 0:
+        return _random.oneOf({"self::a", "self::a or self::b", "self::x or self::y"});
+      case 1:
+        return _random.oneOf({"self::b or ", "self::c or self::x or "}) + condition;
+      default:
+        return condition;
+    }
+  }
+
+  // One node and a set of nodes.
+  std::string membership(int depth) {
+    const std::string set = _variables.empty() ? "(" + path(depth) + ")" : variable();
+    const std::string node = _random.oneOf({".", ".", "./b", variable()});
+    switch (_random.below(4)) {
+      case 0:
+        return "exists(" + node + _random.oneOf({" intersect ", " except "}) + set + ")";
+      case 1:
+        return "count(" + node + " | " + set + ") = count(" + set + ")";
+      case 2:
+        return "count(" + set + " | " + node + ") > 3";
+      default:
+        return "(some $w in " + set + " satisfies " +
+               (_random.below(2) ? "$w is " + node : node + " is $w") + ")";
+    }
+  }
+
+  // What only asks whether there are nodes, or how many.
+  std::string existence(int depth) {
+    const std::string nodes = _random.below(3) ? "." + step(depth) : path(depth);
+    switch (_random.below(4)) {
+      case 0:
+        return nodes;
+      case 1:
+        return "count(" + nodes + ")" +
+               _random.oneOf({" > 0", " = 0", " >= 2", " lt 2", " ne 0", " <= 1", ""});
+      case 2:
+        return _random.oneOf({"1 < ", "0 eq ", "2 >= "}) + "count((" + nodes + "))";
+      default:
+        return _random.oneOf({"exists(", "empty(", "not(", "boolean("}) + nodes + ")";
+    }
+  }
+
   std::string step(int depth) {
     std::string text = _random.oneOf({"/", "/", "//"});
+    if (_random.below(8) == 0) {
+      text += _random.oneOf({"(a | b)", "(a | b | c)", "(@x | @y)", "(a | a)", "(a | @x)"});
+      return depth > 0 && _random.below(3) == 0 ? text + predicate(depth) : text;
+    }
     text += _random.oneOf({"", "", "", "", "@", "..", "self::", "following-sibling::",
                            "preceding-sibling::", "ancestor::", "descendant::", "following::"});
     if (text.ends_with("..")) return text;
@@ -213,7 +275,14 @@ class ProgramGenerator {
       return _functions[_random.below(_functions.size())] + "(" + expr(depth - 1) + ")";
     }
     if (_random.below(5) == 0) {
-      return "subsequence(" + expr(depth - 1) + ", " + _random.oneOf({"1", "2"}) + ")";
+      const std::string items = _random.below(2) ? path(depth - 1) : expr(depth - 1);
+      return "subsequence(" + items + ", " + _random.oneOf({"1", "2", "1, 1", "2, 2", "0, 3"}) +
+             ")";
+    }
+    if (_random.below(5) == 0) {
+      return "(" + path(depth - 1) + ")" +
+             _random.oneOf(
+                 {"[1]", "[2]", "[position() <= 2]", "[position() < 2]", "[3 >= position()]"});
     }
     return functions[_random.below(functions.size())] + "(" + expr(depth - 1) + ")";
   }
@@ -341,7 +410,9 @@ class ProgramGenerator {
 
   std::string expr(int depth) {
     if (depth <= 0) return _random.below(3) ? variable() : literal();
-    switch (_random.below(17)) {
+    switch (_random.below(18)) {
+      case 17:
+        return "(" + existence(depth) + ")";
       case 0:
         return literal();
       case 1:

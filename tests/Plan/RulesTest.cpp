@@ -1,10 +1,14 @@
 // Each rule: where it takes over, where it does not, and that nobody can tell.
+#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Operators/XQueryKeptExpr.h"
 #include "Plan/Operators/XQueryNameComparison.h"
+#include "Plan/Plan.h"
 #include "Plan/PlanTesting.h"
 #include "Plan/Rules.h"
+#include "Platform/Base/WorkMeter.h"
 
+#include <algorithm>
 #include <cstdlib>
 #include <memory>
 #include <set>
@@ -16,8 +20,24 @@ using namespace plantest;
 
 // Of the rules that have no tests of their own.
 size_t operatorsIn(std::string_view text) {
-  return choicesIn(text,
-                   [](std::string_view rule) { return rule == "names" || rule == "invariants"; });
+  static const std::set<std::string_view> others = {"texts", "short paths", "constants", "counts",
+                                                    "sets"};
+  return choicesIn(text, [](std::string_view rule) {
+    return !others.contains(rule) && !rule.ends_with("-joins");
+  });
+}
+
+// How many operators one rule alone puts into a query.
+size_t operatorsOf(std::string_view rule, std::string_view text) {
+  const auto rules = XQueryRules();
+  const auto row = std::find_if(rules.begin(), rules.end(),
+                                [&](const XQueryRule& each) { return each.name == rule; });
+  EXPECT_NE(row, rules.end()) << rule;
+  const auto query = compiled(text);
+  const auto& internal = query->_internal();
+  const auto planned =
+      XQueryPlanned(*internal.prolog(), Ref<XQueryExpr>(internal.body()), {&*row, 1});
+  return OperatorList(*planned).operators.size();
 }
 
 std::vector<std::string> resultOf(std::string_view text, const Value& contextItem = {}) {
@@ -55,6 +75,257 @@ TEST(Switch, OfTheEnvironmentLeavesTheQueryAsItIsWritten) {
   EXPECT_EQ(operators(), 1U);
 }
 
+std::string bodyOf(std::string_view text) {
+  const auto query = compiled(text, XQueryWay::Planned);
+  const XQueryProgram program = programOf(*query);
+  std::string literals;
+  for (XQueryPlaceID place = 0; place < program.placeCount(); ++place) {
+    const auto* literal = dyn_cast<XQueryLiteral>(program[place].expr);
+    if (literal) literals += shownItem(*literal->literalValue()) + ";";
+  }
+  return literals;
+}
+
+// --- name tests ----------------------------------------------------------------------------------
+
+// How many steps of the paths of a query have a choice of names, after planning.
+size_t choicesIn(std::string_view text) {
+  const auto query = compiled(text, XQueryWay::Planned);
+  const XQueryProgram program = programOf(*query);
+  size_t count = 0;
+  for (XQueryPlaceID place = 0; place < program.placeCount(); ++place) {
+    const auto* path = dyn_cast<XQueryPathExpr>(program[place].expr);
+    for (const XQueryStep* step = path ? path->step() : nullptr; step; step = step->next()) {
+      const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
+      count += axisStep && axisStep->choice() ? 1 : 0;
+    }
+  }
+  return count;
+}
+
+// Names with and without prefixes, and instructions, which have names too.
+const Value& names() {
+  static const Value parsed = document(
+      "<r xmlns:p='u'><a x='1' y='2'><b/><p:a/><?a b?></a><c><a/>t<b z='3'/></c><?b c?>"
+      "<d xmlns='v'><a/></d></r>");
+  return parsed;
+}
+
+// The same with so many nodes that they are indexed.
+const Value& manyNames() {
+  static const Value parsed = [] {
+    std::string xml = "<r xmlns:p='u'>";
+    for (int i = 0; i < 200; ++i) xml += "<a x='1'><b/><p:a/><c><b y='2'/></c></a>";
+    return document(xml + "</r>");
+  }();
+  return parsed;
+}
+
+TEST(TakeNames, TakesOverFiltersAndUnions) {
+  for (const char* path :
+       {"//*[self::a]", "//*[self::a or self::b]", "//*[name() = 'a']", "//*['a' eq local-name(.)]",
+        "//node()[name() = ('a', 'b')]", "//element()[self::a or name(.) = 'c'][2]", "//(a | b)",
+        "/r/(a | (b | c))", "//a/(@x | @y)[1]", "//(a | b)[@x]/..", "//*[(self::a) or (self::b)]",
+        "/r/*/*[name() = 'b']/@z", "//a | //b", "(/r/a | /r/b) | /r/c"}) {
+    EXPECT_EQ(choicesIn(path), 1U) << path;
+    for (const Value& tree : {names(), manyNames()}) {
+      resultOf(path, tree);
+      resultOf(std::string("for $i in 1 to 3 return count(") + path + ")", tree);
+    }
+  }
+}
+
+TEST(TakeNames, LeavesOthersAlone) {
+  for (const char* path : {"//*[name() != 'a']",
+                           "//*[name() = '']",
+                           "//*[self::a and self::b]",
+                           "//a[self::a]",
+                           "//*[self::p:a]",
+                           "//*[self::*]",
+                           "//*[child::a]",
+                           "//*[@x][self::a]",
+                           "//(a | @x)",
+                           "//(a | b[1])",
+                           "//(a | b)/position()",
+                           "//(a | ..)",
+                           "//(a, b)",
+                           "//(p:a | a)",
+                           "//*[name() = $g]",
+                           "//*[name() eq ('a', 'b')]",
+                           "//*[self::a or 1]",
+                           "//a | /r/b",
+                           "//a | //@x",
+                           "//a | //b[1]",
+                           "a | b",
+                           "//a, //b",
+                           "unordered {//a | //b}"}) {
+    EXPECT_EQ(choicesIn(path), 0U) << path;
+  }
+}
+
+TEST(TakeNames, FindsWhatTheConditionFinds) {
+  for (const Value& tree : {names(), manyNames()}) {
+    for (const char* test : {"*", "node()", "element()"}) {
+      for (const char* condition :
+           {"self::a", "name() = 'a'", "name() = 'p:a'", "local-name() = 'a'", "name() = ':a'",
+            "name() = ('p:a', 'b')", "self::a or local-name() = 'b'", "name() = 'x'"}) {
+        const std::string filter = std::string(test) + "[" + condition + "]";
+        resultOf("(//" + filter + ", count(//" + filter + "))", tree);
+        resultOf("/r/a[1]//" + filter + "[2]", tree);
+        if (tree == names()) resultOf("//b/ancestor::" + filter, tree);
+        resultOf("//a/descendant-or-self::" + filter + "[last()]", tree);
+        resultOf("//@" + std::string(test) + "[" + condition + "]", tree);
+        if (tree == names()) resultOf("//*/following::" + filter, tree);
+      }
+    }
+  }
+}
+
+// The context may have a default namespace, of which names without a prefix then are.
+TEST(TakeNames, ResolvesNamesInTheContext) {
+  constexpr const char* prolog = "declare default element namespace 'v'; ";
+  EXPECT_EQ(resultOf(std::string(prolog) + "count(//*[self::a or self::d])", names()).front(),
+            "xs:integer 2");
+  EXPECT_EQ(resultOf("<e xmlns='v'>{count(//(a | d))}</e>", names()).size(), 2U);
+  resultOf("declare namespace q = 'u'; //(q:a | b)", names());
+  resultOf("//*[self::p:a]", names());
+}
+
+// --- counts --------------------------------------------------------------------------------------
+
+TEST(CountPaths, TakesOverWhereOnlyTheNumberMatters) {
+  for (const char* text :
+       {"count(//a)", "exists(//a/b)", "empty((//a))", "not(//x)", "boolean(//a[b]/@x)"}) {
+    EXPECT_GE(operatorsOf("counts", text), 1U) << text;
+    resultOf(text, names());
+  }
+  for (const char* condition :
+       {"count(*) > 0", "count(*) >= 2", "2 > count(*)", "count(*) = 0", "0 ne count(*)",
+        "count(*) le 1", "b", "b and @x", "b or @z", "not(b)", "ancestor::c"}) {
+    const std::string text = std::string("//*[") + condition + "]";
+    EXPECT_GE(operatorsOf("counts", text), 1U) << text;
+    resultOf(text, names());
+  }
+  EXPECT_EQ(operatorsOf("counts", "if (//a) then 1 else 2"), 1U);
+  EXPECT_EQ(operatorsOf("counts", "for $a in //a where $a/b return 1"), 1U);
+}
+
+TEST(CountPaths, LeavesOthersAlone) {
+  for (const char* text : {"count((//a, 1))", "count(//a/string(.))", "exists($g)",
+                           "exists(//a[position() < 3])", "exists(//a/(1, 2))", "count(//a[<x/>])",
+                           "exists(//p:a)", "not(//a[trace(., '')])", "string(//a)"}) {
+    EXPECT_EQ(operatorsOf("counts", text), 0U) << text;
+  }
+}
+
+// The number of an integer is not that of a node, nor is the truth of what may be none.
+TEST(CountPaths, LeavesErrorsWhereTheyArise) {
+  for (const char* text :
+       {"count((//a, 1)/b)", "exists((<a><b/></a>, 1)/b)", "not((1, <a/>)/b)", "exists(./a)",
+        "for $i in (//a, 1) where $i/b return 2", "//a[exists((., 1)/b)]", "empty(1/a)"}) {
+    resultOf(text, names());
+    resultOf(text);
+  }
+}
+
+// How much is walked shows in how often predicates are asked: each asking is a step of work.
+int64_t stepsOf(const char* text) {
+  const auto query = compiled(text, XQueryWay::Planned);
+  const auto context = XQueryContext::xqueryContext();
+  context->_internal().setContextItem(manyNames(), 1);
+  (void)query->_internal().body()->evaluateWithContext(*context);  // has the tree indexed
+  const int64_t before = workMeter.stepsLeft;
+  (void)query->_internal().body()->evaluateWithContext(*context);
+  return before - workMeter.stepsLeft;
+}
+
+TEST(CountPaths, EndAsSoonAsTheAnswerIsCertain) {
+  for (const char* text :
+       {"exists(//a[not(@y)])", "empty(//b[..])", "not(/r/a[c]/c[b])", "count(//a[@x]) > 2",
+        "boolean(//(a | b)[not(@z)])", "exists(/r/*[self::a]/*[name() = 'b'])"}) {
+    EXPECT_LT(stepsOf(text), 60) << text;
+  }
+  EXPECT_GT(stepsOf("count(//a[not(@y)])"), 200);
+}
+
+TEST(TakeFirst, EndsAtTheLastNodeThatIsAskedFor) {
+  for (const char* text :
+       {"subsequence(//a[c], 1, 3)", "(//a[@x])[1]", "(/r/a[c]/b)[position() <= 2]",
+        "(//a[b])[2]/c", "(/r/a[b])[position() = 1]"}) {
+    EXPECT_LT(stepsOf(text), 60) << text;
+    resultOf(text, manyNames());
+    resultOf(text, names());
+  }
+  EXPECT_GT(stepsOf("subsequence(//a[@x], 2)"), 200);
+}
+
+TEST(TakeFirst, LeavesAloneWhatMayComeInAnotherOrder) {
+  for (const char* text :
+       {"(//a/b)[1]", "(//a/ancestor::*)[1]", "subsequence(//a//b, 1, 1)", "(//b/..)[1]",
+        "(a/preceding-sibling::*)[1]", "(//a[2])[1]", "(//a)[last()]", "(//a)[0]",
+        "(//*/following::b)[1]", "subsequence(//a, 1.5, 1)"}) {
+    EXPECT_EQ(operatorsOf("first", text), 0U) << text;
+    resultOf(text, names());
+  }
+}
+
+TEST(TakePositions, MakesTheNumberThePredicate) {
+  EXPECT_EQ(bodyOf("//a[position() = 2]"), "xs:integer 2;");
+  EXPECT_EQ(bodyOf("//a[2 eq position()]"), "xs:integer 2;");
+  for (const char* text :
+       {"//a[position() = 1]/@x", "/r/*[self::a][position() = 1]", "//b[@y][2 = position()]",
+        "//a[position() = 0]", "//a[position() = 1.0]", "//a[position() >= 2]", "//a[position()]",
+        "(//a)[position() = 2]", "//a[position() = (1, 2)]"}) {
+    resultOf(text, names());
+    resultOf(text, manyNames());
+  }
+}
+
+// --- members -------------------------------------------------------------------------------------
+
+TEST(AskMembers, TakesOverWhereOneNodeMeetsASet) {
+  for (const char* condition :
+       {"exists(. intersect $set)", ". except $set", "count(. | $set) = count($set)",
+        "count($set | .) > 200", "some $x in $set satisfies $x is .",
+        "some $x in $set satisfies . is $x", "exists(@z intersect $set)"}) {
+    const std::string text = std::string("let $set := //c/b return //b[") + condition + "]";
+    EXPECT_EQ(operatorsOf("members", text), 1U) << text;
+    resultOf(text, manyNames());
+    resultOf(text, names());
+  }
+  EXPECT_EQ(operatorsIn("for $b in //b where exists($b intersect //c/b) return $b"), 2U);
+  resultOf("for $b in //b where exists($b intersect //c/b) return $b", manyNames());
+}
+
+TEST(AskMembers, LeavesOthersAlone) {
+  for (const char* text :
+       {"let $set := //b return //a[exists(b intersect $set)]", "//b[exists(. intersect ../c)]",
+        "let $set := //b return //b[every $x in $set satisfies $x is .]",
+        "let $set := //b return //b[some $x in $set satisfies $x << .]",
+        "let $set := //b return //b[some $x as item() in $set satisfies $x is .]",
+        "let $set := //b return //b[some $x in $set satisfies $x is $x/.]",
+        "let $set := //b return //b[exists(<b/> intersect $set)]",
+        "let $set := //b return count(//b | $set)"}) {
+    EXPECT_EQ(operatorsOf("members", text), 0U) << text;
+    resultOf(text, names());
+  }
+}
+
+// What is no node is an error, and a quantifier leaves its variable where it ended.
+TEST(AskMembers, LeavesErrorsAndVariablesAsTheyAre) {
+  for (const char* text :
+       {"let $set := (//c/b, 1) return //b[exists(. intersect $set)]",
+        "let $set := (//c/b, 1) for $b in //b return $b except $set",
+        "let $set := (//b, //b) for $b in //b return count($b | $set)",
+        "let $set := (//c/b, 1) for $b in //a/b return some $x in $set satisfies $x is $b",
+        "for $b in //a[1]/b return some $x in //c/b, $y in () satisfies $x is $b",
+        "let $set := //c/b for $b in //a return (some $x in $set satisfies $x is $b, "
+        "some $y in (), $z in (1, 2) satisfies $y = 1)"}) {
+    resultOf(text, manyNames());
+    resultOf(text, names());
+  }
+}
+
 // --- names ---------------------------------------------------------------------------------------
 
 TEST(CompareNames, TakesOverFourForms) {
@@ -69,7 +340,7 @@ TEST(CompareNames, TakesOverFourForms) {
 TEST(CompareNames, LeavesOthersAlone) {
   for (const char* condition : {"name() != 'a'", "name(..) = 'a'", "name() = 1", "name() = $g",
                                 "name() = ('a', 'b')", "name() is 'a'", "node-name() = 'a'"}) {
-    EXPECT_EQ(operatorsIn(std::string("//*[") + condition + "]"), 0U) << condition;
+    EXPECT_EQ(operatorsOf("names", std::string("//*[") + condition + "]"), 0U) << condition;
   }
 }
 
@@ -86,17 +357,6 @@ TEST(CompareNames, LooksAtNamesAsTheyAreWritten) {
 }
 
 // --- constants -----------------------------------------------------------------------------------
-
-std::string bodyOf(std::string_view text) {
-  const auto query = compiled(text, XQueryWay::Planned);
-  const XQueryProgram program = programOf(*query);
-  std::string literals;
-  for (XQueryPlaceID place = 0; place < program.placeCount(); ++place) {
-    const auto* literal = dyn_cast<XQueryLiteral>(program[place].expr);
-    if (literal) literals += shownItem(*literal->literalValue()) + ";";
-  }
-  return literals;
-}
 
 TEST(FoldConstants, MakesOneLiteralOfWhatIsConstant) {
   EXPECT_EQ(bodyOf("$g = 2 * (3 + 4)"), "xs:integer 14;");
@@ -165,7 +425,7 @@ TEST(KeepInvariants, LeavesOthersAlone) {
        }) {
     const std::string_view query = text;
     const bool hasInner = query.find("trace") != query.npos || query.find("position") != query.npos;
-    EXPECT_EQ(operatorsIn(text), hasInner ? 1U : 0U) << text;
+    EXPECT_EQ(operatorsOf("invariants", text), hasInner ? 1U : 0U) << text;
   }
 }
 

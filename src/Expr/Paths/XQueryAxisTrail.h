@@ -10,7 +10,7 @@
 //
 // The trail knows what was visited as
 //
-//   an interval of the document   descendant, descendant-or-self, following
+//   an interval of the document   descendant, descendant-or-self, following, attributes below
 //   the latest context item       preceding, ancestor, ancestor-or-self
 //   one context item per parent   following-sibling, preceding-sibling
 //   a set of nodes                parent
@@ -48,6 +48,10 @@ class XQueryAxisTrail {
       case XQueryAxisDescendantOrSelf:
         if (isProperty(node)) return static_cast<void>(visit(node));
         return walkInterval(node, XQueryDescendantStop(node), visit);
+      case XQueryAxisAttributesBelow: {
+        XQueryAttributesVisit visitAttributes(visit);
+        return walkInterval(node, XQueryDescendantStop(node), visitAttributes);
+      }
       case XQueryAxisFollowing:
         return walkFollowing(node, visit);
       case XQueryAxisFollowingSibling:

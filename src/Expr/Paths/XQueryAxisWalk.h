@@ -1,4 +1,4 @@
-// The twelve axes.
+// The twelve axes, and one that joins two of them.
 //
 // XQueryWalkAxis visits the nodes on an axis of a node, in the order in which a path sees them:
 // document order for the forward axes and for preceding, nearest first for the other reverse axes.
@@ -55,6 +55,15 @@ void XQueryWalkNodes(NSXMLNode* first, const NSXMLNode* stop, const Visit& visit
   }
 }
 
+template <class Act>
+void XQueryVisitIndexed(const NSXMLIndexedNodes& indexed, Act act) {
+  WorkPacer pacer;
+  for (NSXMLNode* node : indexed.nodes) {
+    pacer.turn();
+    if (!act(node)) return;
+  }
+}
+
 // Does something with the elements and attributes of a name and passes over all other nodes.
 template <class Act>
 class XQueryNamedVisit {
@@ -69,17 +78,38 @@ class XQueryNamedVisit {
   bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
     const auto indexed = NSXMLIndexedElements(_name, first, stop);
     if (!indexed) return false;
-    WorkPacer pacer;
-    Act act = _act;
-    for (NSXMLNode* node : indexed->nodes) {
-      pacer.turn();
-      if (!act(node)) break;
-    }
+    XQueryVisitIndexed(*indexed, _act);
+    return true;
+  }
+  bool visitIndexedAttributes(const NSXMLNode* first, const NSXMLNode* stop) const {
+    const auto indexed = NSXMLIndexedAttributes(_name, first, stop);
+    if (!indexed) return false;
+    XQueryVisitIndexed(*indexed, _act);
     return true;
   }
 
  private:
   const NSXMLExpandedName* _name;
+  Act _act;
+};
+
+// The same for a test that takes several names and elements alone, or instructions as well.
+template <class Test, class Act>
+class XQueryChoiceVisit {
+ public:
+  XQueryChoiceVisit(Test& test, Act act) : _test(test), _act(act) {}
+
+  bool operator()(NSXMLNode* found) { return !_test.matches(found) || _act(found); }
+  bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
+    const auto indexed =
+        NSXMLIndexedElements(*_test.onlyNames(), _test.acceptsInstructions(), first, stop);
+    if (!indexed) return false;
+    XQueryVisitIndexed(*indexed, _act);
+    return true;
+  }
+
+ private:
+  Test& _test;
   Act _act;
 };
 
@@ -169,6 +199,29 @@ void XQueryWalkPrecedingSiblings(NSXMLNode* node, Visit& visit) {
   }
 }
 
+// Goes from nodes to their attributes.
+template <class Visit>
+class XQueryAttributesVisit {
+ public:
+  explicit XQueryAttributesVisit(Visit& visit) : _visit(visit) {}
+
+  bool operator()(NSXMLNode* node) {
+    bool goesOn = true;
+    auto visitOne = [&](NSXMLNode* attribute) { return goesOn = _visit(attribute); };
+    XQueryWalkAttributes(node, visitOne);
+    return goesOn;
+  }
+  bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
+    if constexpr (requires { _visit.visitIndexedAttributes(first, stop); }) {
+      return _visit.visitIndexedAttributes(first, stop);
+    }
+    return false;
+  }
+
+ private:
+  Visit& _visit;
+};
+
 template <class Visit>
 void XQueryWalkAxis(NSXMLNode* node, int axis, Visit visit) {
   switch (axis) {
@@ -199,6 +252,8 @@ void XQueryWalkAxis(NSXMLNode* node, int axis, Visit visit) {
       return XQueryWalkPrecedingSiblings(node, visit);
     case XQueryAxisAncestorOrSelf:
       return XQueryWalkAncestors(node, visit);
+    case XQueryAxisAttributesBelow:
+      return XQueryWalkNodes(node, XQueryDescendantStop(node), XQueryAttributesVisit(visit));
     default:  // no such axis: nothing is walked
       return;
   }

@@ -19,6 +19,10 @@
 // descendant axis of the node only when no predicate can tell, both are repeatable with all steps
 // after them, and the path's results will be sorted.
 //
+// Where only the number of nodes is wanted, and perhaps not beyond some number, a step filters each
+// node as it finds it and hands it on, so that the walk ends as soon as the answer is certain
+// (countNodes). This too is for steps that can be repeated alone.
+//
 // A walk sees the tree as it was when it began. A later step may put the very node that the walk
 // stands at into an element that it constructs, and a walk upwards would meet that element, the
 // one around it, and so on for ever. So a step before one that may give nodes a parent finds all
@@ -84,6 +88,10 @@ void XQueryStep::setLast(Ref<XQueryStep> last) {
 
 void XQueryStep::setPredicates(std::vector<Ref<XQueryExpr>> predicates) {
   _predicates = std::move(predicates);
+  notePredicates();
+}
+
+void XQueryStep::notePredicates() {
   _literalPositions.clear();
   for (const auto& predicate : _predicates) {
     _literalPositions.push_back(literalPositionOf(predicate.get()));
@@ -118,7 +126,7 @@ void XQueryStep::visitParts(XQueryPartVisitor& visitor, bool isFirst) {
 }
 
 bool XQueryStep::hasRepeatablePredicates(bool variablesMayChange) const {
-  return std::all_of(_predicates.begin(), _predicates.end(), [=](const auto& predicate) {
+  return std::all_of(firstPredicate(), _predicates.end(), [=](const auto& predicate) {
     return !predicate || XQueryIsRepeatable(*predicate, variablesMayChange);
   });
 }
@@ -160,23 +168,29 @@ bool XQueryAxisStep::isValid(const NSXMLNode* node, const XQueryExpr* expr,
   }
 }
 
+void XQueryAxisStep::setChoice(std::unique_ptr<const XQueryNameChoice> names,
+                               size_t predicatesInTest) {
+  _choice = std::move(names);
+  _predicatesInTest = predicatesInTest;
+}
+
 bool XQueryAxisStep::testMayRaise() const {
   if (const auto* nameTest = dyn_cast<XQueryNameTest>(_expr.get())) return nameTest->mayRaise();
   const auto* wildCard = dyn_cast<XQueryWildCardNameTest>(_expr.get());
   return wildCard && wildCard->mayRaise();
 }
 
-// Whether this is the step that "//" stands for.
 bool XQueryAxisStep::isDescendantShorthand() const {
   const auto* test = dyn_cast<XQueryTypeDeclaration>(_expr.get());
-  return _axis == XQueryAxisDescendantOrSelf && _predicates.empty() && test &&
+  return _axis == XQueryAxisDescendantOrSelf && _predicates.empty() && !_choice && test &&
          test->type() == XQueryTypeDeclaration::AnyKindTest && !test->data() &&
          test->acceptsCount(1);
 }
 
-// Whether the step may walk the descendants of a node in place of the children of each of them.
+// Whether the step may walk the descendants of a node in place of the children of each of them, or
+// the attributes below it.
 bool XQueryAxisStep::mayTakeDescendants() const {
-  return _axis == XQueryAxisChild && hasPredicatesOfTruth();
+  return (_axis == XQueryAxisChild || _axis == XQueryAxisAttribute) && hasPredicatesOfTruth();
 }
 
 // Whether walks of a step from different nodes may meet the same node and nothing can tell whether
@@ -184,12 +198,12 @@ bool XQueryAxisStep::mayTakeDescendants() const {
 // walked from. Not counted are steps whose nodes go straight to the results, which hold each node
 // once anyway.
 bool XQueryAxisStep::mayWalkTwice(const XQueryAxisStep* previous) const {
-  if (_axis == XQueryAxisChild) {  // walks descendants in place of a "//" before it
+  // One of these walks what is below in place of a "//" before it.
+  if (_axis == XQueryAxisChild || _axis == XQueryAxisAttribute) {
     return previous && previous->isDescendantShorthand() && mayTakeDescendants();
   }
-  if (!_predicates.empty()) return false;
+  if (hasPredicates()) return false;
   switch (_axis) {
-    case XQueryAxisAttribute:
     case XQueryAxisSelf:
       return false;
     case XQueryAxisParent:
@@ -210,7 +224,7 @@ void XQueryAxisStep::processValue(const Value& items, XQueryPathRun& run, bool v
   for (size_t i = 0; i < list.count(); ++i) {
     if (auto* node = dyn_cast<NSXMLNode>(list[i])) {
       processNode(node, run);
-      if (run.hasFailed) return;
+      if (run.isOver()) return;
     } else if (validate) {
       raiseNoNode(XQueryErrors::contextItemNotANode, run.context);
     }
@@ -220,25 +234,42 @@ void XQueryAxisStep::processValue(const Value& items, XQueryPathRun& run, bool v
 void XQueryAxisStep::processNodes(const std::vector<NSXMLNode*>& nodes, XQueryPathRun& run) const {
   for (NSXMLNode* node : nodes) {
     processNode(node, run);
-    if (run.hasFailed) return;
+    if (run.isOver()) return;
   }
 }
 
 void XQueryAxisStep::processNode(NSXMLNode* node, XQueryPathRun& run) const {
   enter(node, run);
   if (absorbsNextFor(node, run)) {
-    cast<XQueryAxisStep>(_next.get())->take(XQueryAxisDescendant, node, run);
+    const auto* next = cast<XQueryAxisStep>(_next.get());
+    const bool isChild = next->axis() == XQueryAxisChild;
+    next->take(isChild ? XQueryAxisDescendant : XQueryAxisAttributesBelow, node, run);
   } else {
     take(_axis, node, run);
   }
 }
 
 void XQueryAxisStep::take(int axis, NSXMLNode* node, XQueryPathRun& run) const {
-  if (_predicates.empty()) {
+  if (!hasPredicates() || filtersEachFor(run)) {
     stream(axis, node, run);
   } else {
     filter(axis, node, run);
   }
+}
+
+// Whether it is of use to ask the predicates before all nodes are found, and nobody can tell.
+bool XQueryAxisStep::filtersEachFor(const XQueryPathRun& run) const {
+  return _filtersEach && run.results.mayEndEarly() && !run.listingStep && !run.setsEveryFocus;
+}
+
+// The same as filtering a list of nodes where no predicate can tell which place a node has in it.
+bool XQueryAxisStep::keepsAlone(NSXMLNode* node, XQueryPathRun& run) const {
+  for (auto predicate = firstPredicate(); predicate != _predicates.end(); ++predicate) {
+    if (keeps(**predicate, node, 1, run.context)) continue;
+    run.hasFailed = run.context._internal().isFailing();
+    return false;
+  }
+  return true;
 }
 
 bool XQueryAxisStep::absorbsNextFor(const NSXMLNode* node, const XQueryPathRun& run) const {
@@ -253,9 +284,11 @@ void XQueryAxisStep::enter(NSXMLNode* node, XQueryPathRun& run) const {
 // Hands each node on as it is found. What the test asks of a node is copied into the walk, where it
 // stays in registers; names are what is walked for most.
 void XQueryAxisStep::stream(int axis, NSXMLNode* node, XQueryPathRun& run) const {
-  XQueryNodeTest test(_expr.get(), run);
+  XQueryNodeTest test(*this, run);
   if (const NSXMLExpandedName* name = test.onlyName()) {
     streamMatching(axis, node, run, [name](auto act) { return XQueryNamedVisit(name, act); });
+  } else if (test.onlyNames()) {
+    streamMatching(axis, node, run, [&test](auto act) { return XQueryChoiceVisit(test, act); });
   } else {
     streamMatching(axis, node, run, [&test](auto act) {
       return [&test, act](NSXMLNode* found) { return !test.matches(found) || act(found); };
@@ -268,14 +301,16 @@ template <class VisitOf>
 void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& run,
                                     VisitOf visitOf) const {
   const XQueryStep* next = _next.get();
-  const auto handOn = [next, &run](NSXMLNode* found) {
-    if (!next) {
+  const auto handOn = [this, next, &run](NSXMLNode* found) {
+    // A trail may go on after the end.
+    if (run.isOver()) return false;
+    if (hasPredicates() && !keepsAlone(found, run)) return !run.hasFailed;
+    if (next) {
+      next->processNode(found, run);
+    } else {
       run.results.addNode(found, run.context);
-      return true;
     }
-    // A trail may go on after an error.
-    if (!run.hasFailed) next->processNode(found, run);
-    return !run.hasFailed;
+    return !run.isOver();
   };
   if (_gathersFirst) {
     std::vector<NSXMLNode*>& nodes = run.openNodeList();
@@ -284,7 +319,7 @@ void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& ru
                      return true;
                    }));
     for (NSXMLNode* found : nodes) {
-      if (run.hasFailed) break;
+      if (run.isOver()) break;
       next->processNode(found, run);
     }
     run.closeNodeList();
@@ -293,7 +328,8 @@ void XQueryAxisStep::streamMatching(int axis, NSXMLNode* node, XQueryPathRun& ru
   } else {
     XQueryWalkAxis(node, axis, visitOf(handOn));
   }
-  if (!next) run.results.setIsReversed(isReverse());
+  // What predicates have filtered is sorted forward, also where they have become part of the test.
+  if (!next) run.results.setIsReversed(isReverse() && _predicates.empty());
 }
 
 // Gathers the nodes found from one context item, filters them and hands on what is left.
@@ -322,17 +358,18 @@ void XQueryAxisStep::filter(int axis, NSXMLNode* node, XQueryPathRun& run) const
 // predicates are dealt with: the walk stops at the node that a literal position asks for.
 size_t XQueryAxisStep::collect(int axis, NSXMLNode* node, std::vector<NSXMLNode*>& nodes,
                                XQueryPathRun& run) const {
-  XQueryNodeTest test(_expr.get(), run);
-  const auto position = literalPosition(0);
+  XQueryNodeTest test(*this, run);
+  const size_t first = _predicatesInTest;
+  const auto position = hasPredicates() ? literalPosition(first) : std::nullopt;
   if (position && !testMayRaise()) {
     uint64_t left = *position;
-    if (left == 0) return 1;
+    if (left == 0) return first + 1;
     XQueryWalkAlongAxis(node, axis, [&](NSXMLNode* found) {
       if (!test.matches(found) || --left > 0) return true;
       nodes.push_back(found);
       return false;
     });
-    return 1;
+    return first + 1;
   }
   const auto walk = [&](auto visit) {
     if (_trail != noTrail && !run.setsEveryFocus) {
@@ -347,10 +384,12 @@ size_t XQueryAxisStep::collect(int axis, NSXMLNode* node, std::vector<NSXMLNode*
   };
   if (const NSXMLExpandedName* name = test.onlyName()) {
     walk(XQueryNamedVisit(name, add));
+  } else if (test.onlyNames()) {
+    walk(XQueryChoiceVisit(test, add));
   } else {
     walk([&test, add](NSXMLNode* found) { return !test.matches(found) || add(found); });
   }
-  return 0;
+  return first;
 }
 
 // --- filter steps --------------------------------------------------------------------------------
@@ -438,45 +477,7 @@ Ref<XQueryPathExpr> XQueryPathExpr::pathExprWithStep(Ref<XQueryStep> step) {
 void XQueryPathExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
   for (XQueryStep* step = _step.get(); step; step = step->next()) step->bindInfoForProlog(prolog);
-  findShortcuts();
-  findGatheringSteps();
-}
-
-void XQueryPathExpr::findShortcuts() {
-  std::vector<XQueryStep*> steps;
-  bool nodesMayGo = false;  // some nodes are held by an intermediate result only
-  // A quantified expression, say, in a predicate leaves its variable to the steps after it.
-  bool variablesMayChange = false;
-  for (XQueryStep* step = _step.get(); step; step = step->next()) {
-    steps.push_back(step);
-    const bool isFilter = !isa<XQueryAxisStep>(step);
-    if (isFilter && step == _step.get()) continue;  // done before the walk begins
-    nodesMayGo = nodesMayGo || isFilter;
-    variablesMayChange = variablesMayChange || isFilter || !step->hasRepeatablePredicates(false);
-  }
-  _trailCount = 0;
-  // From the end, as long as everything from a step on is repeatable.
-  for (size_t i = steps.size(); i-- > 0;) {
-    auto* step = dyn_cast<XQueryAxisStep>(steps[i]);
-    const bool isRepeatable =
-        step && !step->testMayRaise() && step->hasRepeatablePredicates(variablesMayChange);
-    if (!isRepeatable) break;
-    const auto* next = dyn_cast<XQueryAxisStep>(step->next());
-    step->_absorbsNext = step->isDescendantShorthand() && next && next->mayTakeDescendants();
-    const auto* previous = i == 0 ? nullptr : dyn_cast<XQueryAxisStep>(steps[i - 1]);
-    const bool keepsTrail = !nodesMayGo && step->mayWalkTwice(previous);
-    step->_trail = keepsTrail ? _trailCount++ : XQueryAxisStep::noTrail;
-  }
-}
-
-void XQueryPathExpr::findGatheringSteps() {
-  XQueryStep* last = nullptr;  // the last one that may give nodes a parent
-  for (XQueryStep* step = _step.get(); step; step = step->next()) {
-    if (step->_mayAdopt) last = step;
-  }
-  for (XQueryStep* step = _step.get(); last && step != last; step = step->next()) {
-    if (auto* axisStep = dyn_cast<XQueryAxisStep>(step)) axisStep->_gathersFirst = true;
-  }
+  noteChange();
 }
 
 void XQueryPathExpr::visitParts(XQueryPartVisitor& visitor) {
@@ -487,37 +488,85 @@ void XQueryPathExpr::visitParts(XQueryPartVisitor& visitor) {
 
 Value XQueryPathExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
+  XQueryPathResults results;
+  Value items;
+  switch (evaluateSteps(context, items, results)) {
+    case Answer::Failed:
+      return {};
+    case Answer::Items:
+      return items;
+    case Answer::Results:
+      break;
+  }
+  return results.value(context._internal().ordered());
+}
+
+std::optional<uint64_t> XQueryPathExpr::countNodes(uint64_t most, XQueryContext& context) const {
+  XQueryCheckStack(context);
+  XQueryPathResults results;
+  results.endAfter(most);
+  results.countOnly();
+  Value items;
+  const Answer answer = evaluateSteps(context, items, results);
+  if (answer == Answer::Failed) return std::nullopt;
+  // What answers nodes goes through all of the steps, but for no items at all.
+  return answer == Answer::Items ? 0 : std::min(results.count(), most);
+}
+
+// An item that is no node is an error, wherever it stands among the others. The first nodes of all
+// are those that are found first only where these come in order.
+bool XQueryPathExpr::mayEndEarly(const XQueryStep& step, const Value& items,
+                                 const XQueryPathRun& run) const {
+  if (run.setsEveryFocus || run.results.countsOnly()) return !run.setsEveryFocus;
+  const auto* start = dyn_cast<NSXMLNode>(items.get());
+  const auto* axisStep = dyn_cast<XQueryAxisStep>(&step);
+  if (!start || !axisStep || !run.orderIsFree) return false;
+  return !axisStep->_absorbsNext || axisStep->absorbsNextFor(start, run);
+}
+
+Value XQueryPathExpr::firstItems(uint64_t most, XQueryContext& context) const {
+  XQueryCheckStack(context);
+  XQueryPathResults results;
+  results.endAfter(most);
+  Value items;
+  const Answer answer = evaluateSteps(context, items, results);
+  if (answer == Answer::Results) return results.value(context._internal().ordered());
+  return answer == Answer::Items ? items : Value();
+}
+
+// An error leaves the focus as it was when it was raised.
+XQueryPathExpr::Answer XQueryPathExpr::evaluateSteps(XQueryContext& context, Value& items,
+                                                     XQueryPathResults& results) const {
   auto& dynamic = context._internal();
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
   Value contextItem = dynamic.contextItem();
-  Value result = evaluateSteps(context);
-  if (XQueryHasFailed(result, context)) return {};
-  // An error leaves the focus as it was when it was raised.
+  const Answer answer = walkSteps(context, items, results);
+  if (answer == Answer::Failed) return answer;
   dynamic.setContextItem(std::move(contextItem), position);
   dynamic.setLast(last);
-  return result;
+  return answer;
 }
 
-Value XQueryPathExpr::evaluateSteps(XQueryContext& context) const {
+XQueryPathExpr::Answer XQueryPathExpr::walkSteps(XQueryContext& context, Value& items,
+                                                 XQueryPathResults& results) const {
   const auto& dynamic = context._internal();
   const XQueryStep* step = _step.get();
-  Value items = dynamic.contextItem();
+  items = dynamic.contextItem();
   if (!isa<XQueryAxisStep>(step)) {
     items = step ? evaluateFirstStep(*step, context) : Value(NSNull::null());
-    if (XQueryHasFailed(items, context)) return {};
+    if (XQueryHasFailed(items, context)) return Answer::Failed;
     if (step) step = step->next();
   }
-  if (!step || isNull(items)) return items;
+  if (!step || isNull(items)) return Answer::Items;
 
-  XQueryPathResults results;
   XQueryPathRun run(results, context);
   run.setsEveryFocus = !allAreNodes(items);
   run.orderIsFree = dynamic.ordered();
+  if (results.mayEndEarly() && !mayEndEarly(*step, items, run)) results.takeAll();
   run.trailCount = _trailCount;
   if (!_picker || !pickNodes(items, *step, run)) step->processValue(items, run, true);
-  if (run.hasFailed) return {};
-  return results.value(dynamic.ordered());
+  return run.hasFailed ? Answer::Failed : Answer::Results;
 }
 
 Value XQueryPathExpr::evaluateFirstStep(const XQueryStep& step, XQueryContext& context) const {

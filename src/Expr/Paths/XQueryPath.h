@@ -6,6 +6,7 @@
 // tree is kept alive by the item the path started from.
 #pragma once
 
+#include "Expr/Paths/XQueryNameChoice.h"
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
 #include "Expr/XQueryPicker.h"
@@ -33,6 +34,8 @@ enum XQueryAxis : int {
   XQueryAxisPreceding = 10,
   XQueryAxisPrecedingSibling = 11,
   XQueryAxisAncestorOrSelf = 12,
+  // No axis of a query: the attributes of a node and of all below it, as "//@a" finds them.
+  XQueryAxisAttributesBelow = 13,
 };
 
 class XQueryStep : public NSCounted {
@@ -49,6 +52,9 @@ class XQueryStep : public NSCounted {
   void setLast(Ref<XQueryStep> last);
   const std::vector<Ref<XQueryExpr>>& predicates() const { return _predicates; }
   void setPredicates(std::vector<Ref<XQueryExpr>> predicates);
+  // How many of the first predicates are part of the test (XQueryAxisStep::setChoice) and evaluated
+  // no more.
+  size_t predicatesInTest() const { return _predicatesInTest; }
   // Whether the predicate is a numeric literal, which is never evaluated: it asks for a position.
   bool asksForPosition(size_t index) const { return literalPosition(index).has_value(); }
 
@@ -77,6 +83,12 @@ class XQueryStep : public NSCounted {
   bool filterNodes(std::vector<NSXMLNode*>& nodes, size_t fromIndex, XQueryContext& context) const;
   // Whether every predicate may be evaluated again (XQueryIsRepeatable).
   bool hasRepeatablePredicates(bool variablesMayChange) const;
+  bool loadsDocuments() const;
+  // Whether predicates are left that are no part of the test.
+  bool hasPredicates() const { return _predicatesInTest < _predicates.size(); }
+  auto firstPredicate() const {
+    return _predicates.begin() + static_cast<std::ptrdiff_t>(_predicatesInTest);
+  }
   // Whether every predicate keeps an item for what it finds true of it, wherever the item stands,
   // and without loading documents. The predicates are repeatable: none of them can ask for a
   // position, so one that never answers a number cannot tell it.
@@ -91,8 +103,10 @@ class XQueryStep : public NSCounted {
   Ref<XQueryStep> _tail;   // where the last setLast ended: the chain's end, or near it
   bool _isCutOff = false;  // a link before this step was replaced: no tail any more
   std::vector<Ref<XQueryExpr>> _predicates;
+  size_t _predicatesInTest = 0;
 
  private:
+  void notePredicates();
   static std::optional<uint64_t> literalPositionOf(const XQueryExpr* predicate);
   // processItems within one evaluation of a path: for a value of any shape, for one node, and for
   // the nodes that a step with predicates kept. All of them end the run (hasFailed) at an error.
@@ -118,8 +132,14 @@ class XQueryAxisStep : public XQueryStep {
     return _axis >= XQueryAxisAncestor && _axis <= XQueryAxisAncestorOrSelf;
   }
   static bool isValid(const NSXMLNode* node, const XQueryExpr* expr, XQueryContext& context);
+  // Has the step take, of the nodes that its test accepts, those of one of the names alone, which
+  // is what so many of its first predicates ask for. The path is told (XQueryPathExpr).
+  void setChoice(std::unique_ptr<const XQueryNameChoice> names, size_t predicatesInTest);
+  const XQueryNameChoice* choice() const { return _choice.get(); }
   // Whether asking the node test of a node may be an error.
   bool testMayRaise() const;
+  // Whether this is the step that "//" stands for.
+  bool isDescendantShorthand() const;
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   void processItems(const Value& items, XQueryPathResults& toResults, XQueryContext& forContext,
@@ -141,20 +161,28 @@ class XQueryAxisStep : public XQueryStep {
   template <class VisitOf>
   void streamMatching(int axis, NSXMLNode* node, XQueryPathRun& run, VisitOf visitOf) const;
   void filter(int axis, NSXMLNode* node, XQueryPathRun& run) const;
+  bool filtersEachFor(const XQueryPathRun& run) const;
+  bool keepsAlone(NSXMLNode* node, XQueryPathRun& run) const;
   size_t collect(int axis, NSXMLNode* node, std::vector<NSXMLNode*>& nodes,
                  XQueryPathRun& run) const;
-  bool isDescendantShorthand() const;
   bool mayTakeDescendants() const;
   void take(int axis, NSXMLNode* node, XQueryPathRun& run) const;
   bool mayWalkTwice(const XQueryAxisStep* previous) const;
+  void forgetShortcuts() {
+    _absorbsNext = false;
+    _filtersEach = false;
+    _trail = noTrail;
+  }
   bool absorbsNextFor(const NSXMLNode* node, const XQueryPathRun& run) const;
   friend class XQueryPathExpr;
 
   static constexpr size_t noTrail = SIZE_MAX;
 
   int _axis;
+  std::unique_ptr<const XQueryNameChoice> _choice;  // set by planning; null for none
   // Set by binding, see XQueryPath.cpp.
   bool _absorbsNext = false;
+  bool _filtersEach = false;
   bool _gathersFirst = false;
   size_t _trail = noTrail;
 };
@@ -229,10 +257,27 @@ class XQueryPathExpr : public XQueryExpr {
   // and for items that are no nodes.
   bool listNodesBefore(const XQueryStep& step, XQueryContext& context,
                        std::vector<Value>& nodes) const;
-  // The chain of steps does not change afterwards.
+  // The chain of steps changes afterwards only where the path is told.
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  // How many nodes the path finds, or `most` where there are more, having looked no further than
+  // that takes. None after an error. For a path that countsNodes.
+  std::optional<uint64_t> countNodes(uint64_t most, XQueryContext& context) const;
+  // Its value, of which only the first so many items are wanted: there may be more of them. Null
+  // after an error. For a path that findsInOrder.
+  Value firstItems(uint64_t most, XQueryContext& context) const;
+  // Whether the path countsNodes and finds them in the order of its value when it starts from one.
+  bool findsInOrder() const { return _findsInOrder; }
+  // Whether the path answers nodes and, once its first step is evaluated to nodes, nobody can tell
+  // how far it was walked: what is left does nothing and cannot fail.
+  bool countsNodes() const { return _countsNodes; }
   void visitParts(XQueryPartVisitor& visitor) override;
+
+  // For planning, before operators have been put in the places of predicates: a step was changed,
+  // or another one takes over from the one behind `previous`, its predicates and what follows. The
+  // answer is the step that has gone.
+  void noteChange();
+  [[nodiscard]] Ref<XQueryStep> replaceStepBehind(XQueryStep& previous, const Ref<XQueryStep>& by);
 
  protected:
   explicit XQueryPathExpr(Ref<XQueryStep> step)
@@ -241,19 +286,25 @@ class XQueryPathExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  Value evaluateSteps(XQueryContext& context) const;
+  enum class Answer : uint8_t { Failed, Items, Results };
+  Answer evaluateSteps(XQueryContext& context, Value& items, XQueryPathResults& results) const;
+  Answer walkSteps(XQueryContext& context, Value& items, XQueryPathResults& results) const;
   Value evaluateFirstStep(const XQueryStep& step, XQueryContext& context) const;
   bool listNodes(const Value& start, const XQueryStep& firstStep, const XQueryStep& step,
                  XQueryPathRun& run, std::vector<Value>& listed) const;
   bool pickItems(Value& items, XQueryContext& context) const;
   bool pickNodes(const Value& start, const XQueryStep& firstStep, XQueryPathRun& run) const;
   void findShortcuts();
+  bool arrivesInOrder() const;
+  bool mayEndEarly(const XQueryStep& step, const Value& items, const XQueryPathRun& run) const;
   void findGatheringSteps();
 
   Ref<XQueryStep> _step;
   size_t _trailCount = 0;
   std::unique_ptr<const XQueryPicker> _picker;
   const XQueryStep* _pickedStep = nullptr;
+  bool _countsNodes = false;
+  bool _findsInOrder = false;
 };
 
 }  // namespace xquery

@@ -68,9 +68,13 @@ void XQueryPathResults::storeByIdentity(NSObject* item) {
   if (item == _lastStored) return;
   if (_lastStored && _arrival != Arrival::Mixed) {
     _arrival = Arrival::Mixed;
+    WorkPacer pacer;
+    for (const NSXMLNode* stored : _counted) {
+      pacer.turn();
+      _unique.insert(stored);
+    }
     if (_firstResult) _unique.insert(_firstResult.get());
     if (_array) {
-      WorkPacer pacer;
       for (const Value& stored : _array->objects()) {
         pacer.turn();
         _unique.insert(stored.get());
@@ -83,7 +87,10 @@ void XQueryPathResults::storeByIdentity(NSObject* item) {
 
 void XQueryPathResults::append(NSObject* item) {
   _lastStored = item;
-  if (_array) {
+  ++_count;
+  if (_countsOnly) {
+    _counted.push_back(cast<NSXMLNode>(item));
+  } else if (_array) {
     _array->objects().push_back(Value(item));
   } else if (_firstResult) {
     _array = NSArray::array();

@@ -1,4 +1,5 @@
 // What a path's last step yields: duplicates removed by identity, ordered on request.
+// Where only their number is asked for, and perhaps not beyond some number, nothing is referenced.
 //
 // While nodes of one tree arrive in strictly ascending document order, which is nearly always, the
 // order itself proves that they are distinct and sorted: no identity set is kept and nothing is
@@ -12,6 +13,7 @@
 #include "xquery/Object.h"
 #include "xquery/XMLNode.h"
 
+#include <cstdint>
 #include <vector>
 
 namespace xquery {
@@ -24,6 +26,18 @@ class XQueryPathResults {
   void add(const NSObject* value, XQueryContext& context);
   // The same for one node.
   void addNode(NSXMLNode* node, XQueryContext& context);
+  // Only the first so many items are wanted. To be said first, as the next one.
+  void endAfter(uint64_t most) { _most = most; }
+  // Of nodes only the number is wanted.
+  void countOnly() { _countsOnly = true; }
+  // All are wanted after all.
+  void takeAll() { _most = UINT64_MAX; }
+  bool countsOnly() const { return _countsOnly; }
+  // Whether they may be complete before all nodes have been found.
+  bool mayEndEarly() const { return _most != UINT64_MAX; }
+  // Whether further nodes make no difference.
+  bool isComplete() const { return _count >= _most; }
+  uint64_t count() const { return _count; }
   void setIsReversed(bool isReversed) { _isReversed = isReversed; }
   bool isReversed() const { return _isReversed; }
   // A value shape. Nodes are sorted when `ordered`, into reverse document order after a reverse
@@ -42,8 +56,12 @@ class XQueryPathResults {
   void storeByIdentity(NSObject* item);
   void sort(std::vector<Value>& nodes);
 
-  Value _firstResult;   // the only item
-  Ref<NSArray> _array;  // two or more items
+  uint64_t _most = UINT64_MAX;
+  uint64_t _count = 0;
+  bool _countsOnly = false;
+  std::vector<NSXMLNode*> _counted;  // in place of the items, where they are counted only
+  Value _firstResult;                // the only item
+  Ref<NSArray> _array;               // two or more items
   NSObject* _lastStored = nullptr;
   XQueryIdentitySet _unique;  // in use while the arrival is mixed
   Arrival _arrival = Arrival::AnyOrder;

@@ -44,17 +44,36 @@ XQueryAxisTrail& XQueryPathRun::trail(size_t index) {
   return found.trail;
 }
 
-XQueryNodeTest::XQueryNodeTest(const XQueryExpr* expr, XQueryPathRun& run)
-    : _expr(expr), _run(run) {
-  switch (expr ? expr->kind() : Kind::None) {
+XQueryNodeTest::XQueryNodeTest(const XQueryAxisStep& step, XQueryPathRun& run)
+    : _expr(step.expr()), _run(run), _choice(step.choice()) {
+  setTest();
+  if (_choice) setChoice();
+}
+
+// The test accepts nodes by their kind alone.
+void XQueryNodeTest::setChoice() {
+  if (const XQueryNameTest* only = _choice->onlyTest()) {
+    const uint32_t kinds = _kinds;
+    setNameTest(*only);
+    _kinds &= kinds;
+    _expr = only;
+    _choice = nullptr;
+    return;
+  }
+  ask(_choice->isOfTests() ? _kinds & elementsAndAttributes : _kinds);
+  _namesAreKnown = !_choice->needsContext() || !_run.contextHasDefaultNamespace();
+}
+
+void XQueryNodeTest::setTest() {
+  switch (_expr ? _expr->kind() : Kind::None) {
     case Kind::NameTest:
-      setNameTest(*cast<XQueryNameTest>(expr));
+      setNameTest(*cast<XQueryNameTest>(_expr));
       break;
     case Kind::WildCardNameTest:
-      setWildCard(*cast<XQueryWildCardNameTest>(expr));
+      setWildCard(*cast<XQueryWildCardNameTest>(_expr));
       break;
     case Kind::TypeDeclaration:
-      setKindTest(*cast<XQueryTypeDeclaration>(expr));
+      setKindTest(*cast<XQueryTypeDeclaration>(_expr));
       break;
     default:  // matches nothing
       break;
@@ -105,6 +124,7 @@ void XQueryNodeTest::setKindTest(const XQueryTypeDeclaration& test) {
 }
 
 bool XQueryNodeTest::matchesFurther(const NSXMLNode* node) {
+  if (_choice) return _choice->accepts(*node, _namesAreKnown ? nullptr : &_run.context);
   const auto* nameTest = dyn_cast<XQueryNameTest>(_expr);
   if (!nameTest || !nameTest->isDeferred()) {
     return XQueryAxisStep::isValid(node, _expr, _run.context);

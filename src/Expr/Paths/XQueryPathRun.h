@@ -9,11 +9,14 @@
 #include "xquery/XMLNode.h"
 
 #include <cstdint>
-#include <deque>
+#include <memory>
 #include <utility>
 #include <vector>
 
 namespace xquery {
+
+class XQueryAxisStep;
+class XQueryNameChoice;
 
 class XQueryPathRun {
  public:
@@ -27,6 +30,8 @@ class XQueryPathRun {
   bool setsEveryFocus = true;
   // An error has come up: the steps hand nothing on any more.
   bool hasFailed = false;
+  // Whether the steps have nothing more to hand on.
+  bool isOver() const { return hasFailed || results.isComplete(); }
   // The results will be sorted, so the order in which nodes arrive is free.
   bool orderIsFree = false;
 
@@ -48,8 +53,10 @@ class XQueryPathRun {
   // A list for the nodes of one context item, empty; lists are closed in the reverse order of their
   // opening and used again by the next context item. An error abandons them with the run.
   std::vector<NSXMLNode*>& openNodeList() {
-    if (_openNodeLists == _nodeLists.size()) _nodeLists.emplace_back();
-    std::vector<NSXMLNode*>& nodes = _nodeLists[_openNodeLists++];
+    if (_openNodeLists == _nodeLists.size()) {
+      _nodeLists.push_back(std::make_unique<std::vector<NSXMLNode*>>());
+    }
+    std::vector<NSXMLNode*>& nodes = *_nodeLists[_openNodeLists++];
     nodes.clear();
     return nodes;
   }
@@ -59,7 +66,7 @@ class XQueryPathRun {
   enum class DefaultNamespace : uint8_t { Unknown, None, Present };
 
   std::vector<std::pair<const XQueryNameTest*, NSXMLExpandedNameRef>> _deferredNames;
-  std::deque<std::vector<NSXMLNode*>> _nodeLists;
+  std::vector<std::unique_ptr<std::vector<NSXMLNode*>>> _nodeLists;
   struct Trail {
     XQueryAxisTrail trail;
     uint64_t changeCount = 0;  // NSXMLTree::changeCount at its last use
@@ -77,9 +84,11 @@ constexpr uint32_t XQueryKindBit(Kind kind) {
 // A node test in the form that is quickest to ask: the kinds of node it accepts as bits and, for a
 // name, the interned name. It answers as XQueryAxisStep::isValid does; what the two words cannot
 // say is asked there.
+//
+// A step with a choice of names accepts what the test accepts and has one of the names.
 class XQueryNodeTest {
  public:
-  XQueryNodeTest(const XQueryExpr* expr, XQueryPathRun& run);
+  XQueryNodeTest(const XQueryAxisStep& step, XQueryPathRun& run);
 
   bool matches(const NSXMLNode* node) {
     if ((_kinds & XQueryKindBit(node->kind())) == 0) return false;
@@ -89,8 +98,15 @@ class XQueryNodeTest {
   // The name that an element or attribute needs when it needs nothing else, and other nodes cannot
   // have; null for another test.
   const NSXMLExpandedName* onlyName() const { return _name; }
+  // The same for names of which a node needs one; instructions may have them as well.
+  const NSXMLNameSelection* onlyNames() const { return _namesAreKnown ? _choice : nullptr; }
+  bool acceptsInstructions() const {
+    return (_kinds & XQueryKindBit(Kind::ProcessingInstruction)) != 0;
+  }
 
  private:
+  void setTest();
+  void setChoice();
   void setNameTest(const XQueryNameTest& test);
   void setWildCard(const XQueryWildCardNameTest& test);
   void setKindTest(const XQueryTypeDeclaration& test);
@@ -104,8 +120,10 @@ class XQueryNodeTest {
   const XQueryExpr* _expr;
   XQueryPathRun& _run;
   const NSXMLExpandedName* _name = nullptr;
+  const XQueryNameChoice* _choice;
   uint32_t _kinds = 0;
   bool _askFurther = false;
+  bool _namesAreKnown = false;
 };
 
 }  // namespace xquery

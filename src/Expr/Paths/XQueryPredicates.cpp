@@ -135,10 +135,17 @@ std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicat
   return cast<NSNumber>(literal->literalValue())->unsignedIntegerValue();
 }
 
-bool XQueryStep::hasPredicatesOfTruth() const {
-  return std::all_of(_predicates.begin(), _predicates.end(), [](const auto& predicate) {
-    return predicate && answersTruth(predicate.get()) && !XQueryReadsOf(*predicate).loads;
+bool XQueryStep::loadsDocuments() const {
+  return std::any_of(firstPredicate(), _predicates.end(), [](const auto& predicate) {
+    return predicate && XQueryReadsOf(*predicate).loads;
   });
+}
+
+bool XQueryStep::hasPredicatesOfTruth() const {
+  const bool areOfTruth =
+      std::all_of(firstPredicate(), _predicates.end(),
+                  [](const auto& predicate) { return predicate && answersTruth(predicate.get()); });
+  return areOfTruth && !loadsDocuments();
 }
 
 Value XQueryStep::handlePreicatesFromIndex(size_t index, Value items,

@@ -21,12 +21,19 @@ std::vector<XQueryPlaceID> XQueryPredicatesOf(const XQueryPlanning& planning, XQ
     const XQueryPlace& at = planning.program[part];
     if (at.step == &step && at.role == XQueryRole::Predicate) places.push_back(part);
   }
+  // Those that have become part of the test come first.
+  places.erase(places.begin(), places.begin() + static_cast<std::ptrdiff_t>(std::min(
+                                                    places.size(), step.predicatesInTest())));
   return places;
+}
+
+bool XQueryPredicatesAreKnown(const XQueryStep& step, const std::vector<XQueryPlaceID>& places) {
+  return places.size() + step.predicatesInTest() == step.predicates().size();
 }
 
 bool XQueryPredicatesAreOfTruth(const XQueryPlanning& planning, const XQueryStep& step,
                                 const std::vector<XQueryPlaceID>& places) {
-  if (places.empty() || places.size() != step.predicates().size()) return false;
+  if (places.empty() || !XQueryPredicatesAreKnown(step, places)) return false;
   return std::all_of(places.begin(), places.end(), [&](XQueryPlaceID place) {
     using namespace XQueryDeeds;
     const XQueryFacts& facts = planning.facts[place];
@@ -42,9 +49,9 @@ XQueryFacts XQueryFactsUpTo(const XQueryPlanning& planning, XQueryPlaceID path,
   for (const XQueryStep* step = &first;; step = step->next()) {
     if (!staysInside(cast<XQueryAxisStep>(step)->axis())) facts.deeds |= XQueryDeeds::ReadsOutside;
     if (step == &end) return facts;
-    for (const XQueryPlaceID place : XQueryPredicatesOf(planning, path, *step)) {
-      facts.addDeedsWithin(planning.facts[place]);
-    }
+    const auto places = XQueryPredicatesOf(planning, path, *step);
+    if (!XQueryPredicatesAreKnown(*step, places)) facts.deeds |= XQueryDeeds::IsUnrepeatable;
+    for (const XQueryPlaceID place : places) facts.addDeedsWithin(planning.facts[place]);
   }
 }
 

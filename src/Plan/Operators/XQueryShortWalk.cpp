@@ -30,7 +30,7 @@ bool XQueryShortWalk::readFrom(const XQueryExpr& expr) {
 }
 
 bool XQueryShortWalk::readStep(const XQueryAxisStep& step) {
-  if (_count == mostSteps || !step.predicates().empty()) return false;
+  if (_count == mostSteps || !step.predicates().empty() || step.choice()) return false;
   // A parent comes first, so that there is one of them.
   const bool isLeading = _count == 0 || _steps[_count - 1].axis == XQueryAxisParent;
   const bool isOpen = step.axis() == XQueryAxisChild || step.axis() == XQueryAxisAttribute ||

@@ -5,6 +5,7 @@
 #include "Platform/Tree/Names.h"
 
 #include <algorithm>
+#include <iterator>
 
 namespace xquery {
 
@@ -30,7 +31,10 @@ size_t NSXMLNameIndex::placeOf(const NSXMLIndexList<Name>& table, const NSXMLExp
 // name. While it does so, a name's `begin` is its number and its `end` how many nodes it has.
 class NSXMLNameIndex::Maker {
  public:
-  Maker() : _table(smallestTable) {}
+  explicit Maker(uint32_t mostNodes) : _table(smallestTable) {
+    _arrived.reserve(mostNodes);
+    _numbers.reserve(mostNodes);
+  }
 
   void add(const NSXMLNode* node) {
     size_t place = placeOf(_table, node->expandedName());
@@ -40,6 +44,7 @@ class NSXMLNameIndex::Maker {
     _numbers.push_back(name.begin);
     _arrived.push_back(changeable(node));
   }
+  void addInstruction() { _hasInstructions = true; }
   std::unique_ptr<const NSXMLNameIndex> index();
 
  private:
@@ -61,6 +66,7 @@ class NSXMLNameIndex::Maker {
 
   NSXMLIndexList<Name> _table;
   uint32_t _nameCount = 0;
+  bool _hasInstructions = false;
   NSXMLIndexList<NSXMLNode*> _arrived;
   NSXMLIndexList<uint32_t> _numbers;  // of the names of those nodes
 };
@@ -91,21 +97,28 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::Maker::index() {
     made->_nodes[next[_numbers[i]]++] = _arrived[i];
   }
   made->_table = std::move(_table);
+  made->_hasInstructions = _hasInstructions;
   return made;
 }
 
-std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofElements(const NSXMLNode* root) {
-  Maker maker;
+std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofElements(const NSXMLNode* root,
+                                                                 uint32_t mostNodes) {
+  Maker maker(mostNodes);
   WorkPacer pacer;
   for (const NSXMLNode* node = root; node; node = node->nextNode()) {
     pacer.turn();
-    if (node->kind() == Kind::Element) maker.add(node);
+    if (node->kind() == Kind::Element) {
+      maker.add(node);
+    } else if (node->kind() == Kind::ProcessingInstruction) {
+      maker.addInstruction();
+    }
   }
   return maker.index();
 }
 
-std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofAttributes(const NSXMLNode* root) {
-  Maker maker;
+std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofAttributes(const NSXMLNode* root,
+                                                                   uint32_t mostNodes) {
+  Maker maker(mostNodes);
   WorkPacer pacer;
   for (const NSXMLNode* node = root; node; node = node->nextNode()) {
     pacer.turn();
@@ -123,6 +136,34 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofAttributes(const NSXMLNo
 NSXMLNodeSpan NSXMLNameIndex::nodes(const NSXMLExpandedName* name) const {
   const Name& found = _table[placeOf(_table, name)];
   return NSXMLNodeSpan(_nodes).subspan(found.begin, found.end - found.begin);
+}
+
+NSXMLIndexList<NSXMLNode*> NSXMLNameIndex::nodes(const NSXMLNameSelection& selection,
+                                                 const NSXMLNode* first,
+                                                 const NSXMLNode* stop) const {
+  WorkPacer pacer;
+  const auto isBefore = [&pacer](const NSXMLNode* a, const NSXMLNode* b) {
+    pacer.turn();
+    return a->orderNumber() < b->orderNumber();
+  };
+  NSXMLIndexList<NSXMLNode*> found;
+  NSXMLIndexList<NSXMLNode*> merged;
+  for (const Name& name : _table) {
+    pacer.turn();
+    if (!name.name || !selection.mayTake(*name.name)) continue;
+    const NSXMLNodeSpan all = NSXMLNodeSpan(_nodes).subspan(name.begin, name.end - name.begin);
+    const NSXMLNodeSpan more = between(all, first, stop);
+    merged.clear();
+    merged.reserve(found.size() + more.size());
+    std::merge(found.begin(), found.end(), more.begin(), more.end(), std::back_inserter(merged),
+               isBefore);
+    found.swap(merged);
+  }
+  std::erase_if(found, [&](const NSXMLNode* node) {
+    pacer.turn();
+    return !selection.takes(*node);
+  });
+  return found;
 }
 
 NSXMLNodeSpan NSXMLNameIndex::between(NSXMLNodeSpan nodes, const NSXMLNode* first,

@@ -27,16 +27,36 @@ using NSXMLNodeSpan = std::span<NSXMLNode* const>;
 template <class T>
 using NSXMLIndexList = std::vector<T, ValueAllocator<T>>;
 
+// Which names somebody looks for.
+class NSXMLNameSelection {
+ public:
+  // Whether nodes of the expanded name may be among what is looked for.
+  virtual bool mayTake(const NSXMLExpandedName& name) const = 0;
+  // Whether such a node is.
+  virtual bool takes(const NSXMLNode& node) const = 0;
+
+ protected:
+  ~NSXMLNameSelection() = default;
+};
+
 class NSXMLNameIndex {
  public:
-  // Of everything under the root of a tree whose order numbers are good.
-  [[nodiscard]] static std::unique_ptr<const NSXMLNameIndex> ofElements(const NSXMLNode* root);
-  [[nodiscard]] static std::unique_ptr<const NSXMLNameIndex> ofAttributes(const NSXMLNode* root);
+  // Of everything under the root of a tree whose order numbers are good. Room is made for at most
+  // so many nodes at once, and for more as they come.
+  [[nodiscard]] static std::unique_ptr<const NSXMLNameIndex> ofElements(const NSXMLNode* root,
+                                                                        uint32_t mostNodes = 0);
+  [[nodiscard]] static std::unique_ptr<const NSXMLNameIndex> ofAttributes(const NSXMLNode* root,
+                                                                          uint32_t mostNodes = 0);
   // What making one takes at most while it is made, for a tree of so many nodes.
   static size_t mostBytes(uint64_t nodes) { return nodes * bytesPerNode; }
 
   // All nodes of this name.
   NSXMLNodeSpan nodes(const NSXMLExpandedName* name) const;
+  // The nodes of several names, from `first` on before `stop` as below, in document order.
+  NSXMLIndexList<NSXMLNode*> nodes(const NSXMLNameSelection& selection, const NSXMLNode* first,
+                                   const NSXMLNode* stop) const;
+  // Whether the tree of an index of elements has processing instructions, which have names too.
+  bool hasInstructions() const { return _hasInstructions; }
   // Of nodes in document order those from `first` on that come before `stop`, which is null for the
   // end of the tree. The attributes of a node come after it and before its children.
   static NSXMLNodeSpan between(NSXMLNodeSpan nodes, const NSXMLNode* first, const NSXMLNode* stop);
@@ -50,9 +70,8 @@ class NSXMLNameIndex {
     uint32_t begin = 0;
     uint32_t end = 0;
   };
-  // The list of nodes and that of their names, each once more while it grows, and the result.
-  static constexpr size_t bytesPerNode =
-      3 * (sizeof(NSXMLNode*) + sizeof(uint32_t)) + sizeof(NSXMLNode*);
+  // The list of nodes and that of their names, and the result.
+  static constexpr size_t bytesPerNode = 2 * sizeof(NSXMLNode*) + sizeof(uint32_t);
 
   NSXMLNameIndex() = default;
   // The name's own place, or the empty one where it belongs.
@@ -60,6 +79,7 @@ class NSXMLNameIndex {
 
   NSXMLIndexList<Name> _table;  // 2^n places, at most half of them taken
   NSXMLIndexList<NSXMLNode*> _nodes;
+  bool _hasInstructions = false;
 };
 
 }  // namespace xquery

@@ -108,7 +108,7 @@ const Index* NSXMLTreeIndexes::makeOnce(Place<Index>& place, size_t bytes, Make 
 
 const NSXMLNameIndex* NSXMLTreeIndexes::makeElements() {
   return makeOnce(_elements, NSXMLNameIndex::mostBytes(_lastNumber),
-                  [this] { return NSXMLNameIndex::ofElements(_root); });
+                  [this] { return NSXMLNameIndex::ofElements(_root, _lastNumber); });
 }
 
 const NSXMLNameIndex* NSXMLTreeIndexes::elements(uint64_t work) {
@@ -121,7 +121,7 @@ const NSXMLNameIndex* NSXMLTreeIndexes::attributes(uint64_t work) {
   const NSXMLNameIndex* const present = _attributes.index.load(std::memory_order_acquire);
   if (present || !isWorth(_attributes.workDone, work)) return present;
   return makeOnce(_attributes, NSXMLNameIndex::mostBytes(_lastNumber),
-                  [this] { return NSXMLNameIndex::ofAttributes(_root); });
+                  [this] { return NSXMLNameIndex::ofAttributes(_root, _lastNumber); });
 }
 
 const NSXMLValueIndex* NSXMLTreeIndexes::values(const NSXMLValueKey& key, uint64_t work) {
@@ -155,20 +155,58 @@ NSXMLTreeIndexes::KeyPlace* NSXMLTreeIndexes::placeOf(const NSXMLValueKey& key) 
 
 // --- walks ---------------------------------------------------------------------------------------
 
+namespace {
+
+// The indexes of the tree if the walk from `first` to `stop` is long enough to ask them, and how
+// many nodes it will meet at most.
+struct IndexesForWalk {
+  NSXMLIndexesRef indexes;
+  uint32_t work = 0;
+};
+
+IndexesForWalk indexesForWalk(const NSXMLNode* first, const NSXMLNode* stop) {
+  if (!NSXMLTree::of(first)->isOrderFresh()) return {};
+  const uint32_t number = first->orderNumber();
+  if (stop && stop->orderNumber() - number < NSXMLTreeIndexes::fewNodes) return {};
+  NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(first);
+  if (!indexes) return {};
+  const uint32_t work = (stop ? stop->orderNumber() : indexes->lastNumber() + 1) - number;
+  if (work < NSXMLTreeIndexes::fewNodes) return {};
+  return {std::move(indexes), work};
+}
+
+}  // namespace
+
 std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLExpandedName* name,
                                                       const NSXMLNode* first,
                                                       const NSXMLNode* stop) {
-  if (!NSXMLTree::of(first)->isOrderFresh()) return std::nullopt;
-  const uint32_t number = first->orderNumber();
-  if (stop && stop->orderNumber() - number < NSXMLTreeIndexes::fewNodes) return std::nullopt;
-  NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(first);
-  if (!indexes) return std::nullopt;
-  const uint32_t end = stop ? stop->orderNumber() : indexes->lastNumber() + 1;
-  if (end - number < NSXMLTreeIndexes::fewNodes) return std::nullopt;
-  const NSXMLNameIndex* const elements = indexes->elements(end - number);
+  IndexesForWalk walk = indexesForWalk(first, stop);
+  const NSXMLNameIndex* const elements = walk.indexes ? walk.indexes->elements(walk.work) : nullptr;
   if (!elements) return std::nullopt;
-  return NSXMLIndexedNodes{std::move(indexes),
+  return NSXMLIndexedNodes{std::move(walk.indexes),
                            NSXMLNameIndex::between(elements->nodes(name), first, stop)};
+}
+
+std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLNameSelection& names,
+                                                      bool withInstructions, const NSXMLNode* first,
+                                                      const NSXMLNode* stop) {
+  IndexesForWalk walk = indexesForWalk(first, stop);
+  const NSXMLNameIndex* const elements = walk.indexes ? walk.indexes->elements(walk.work) : nullptr;
+  if (!elements || (withInstructions && elements->hasInstructions())) return std::nullopt;
+  NSXMLIndexedNodes found{std::move(walk.indexes), {}, elements->nodes(names, first, stop)};
+  found.nodes = found.merged;
+  return found;
+}
+
+std::optional<NSXMLIndexedNodes> NSXMLIndexedAttributes(const NSXMLExpandedName* name,
+                                                        const NSXMLNode* first,
+                                                        const NSXMLNode* stop) {
+  IndexesForWalk walk = indexesForWalk(first, stop);
+  const NSXMLNameIndex* const attributes =
+      walk.indexes ? walk.indexes->attributes(walk.work) : nullptr;
+  if (!attributes) return std::nullopt;
+  return NSXMLIndexedNodes{std::move(walk.indexes),
+                           NSXMLNameIndex::between(attributes->nodes(name), first, stop)};
 }
 
 }  // namespace xquery

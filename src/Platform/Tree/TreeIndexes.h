@@ -123,6 +123,7 @@ class NSXMLTreeIndexes {
 struct NSXMLIndexedNodes {
   NSXMLIndexesRef indexes;
   NSXMLNodeSpan nodes;
+  NSXMLIndexList<NSXMLNode*> merged{};  // of several names
 };
 
 // The elements of the name that a walk in document order meets from `first` on before `stop`, which
@@ -130,5 +131,15 @@ struct NSXMLIndexedNodes {
 [[nodiscard]] std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLExpandedName* name,
                                                                     const NSXMLNode* first,
                                                                     const NSXMLNode* stop);
+// The same for several names. `withInstructions`: the walk looks for processing instructions too,
+// so that a tree that has some must be walked.
+[[nodiscard]] std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLNameSelection& names,
+                                                                    bool withInstructions,
+                                                                    const NSXMLNode* first,
+                                                                    const NSXMLNode* stop);
+// The attributes of the name of the elements from `first` on before `stop`.
+[[nodiscard]] std::optional<NSXMLIndexedNodes> NSXMLIndexedAttributes(const NSXMLExpandedName* name,
+                                                                      const NSXMLNode* first,
+                                                                      const NSXMLNode* stop);
 
 }  // namespace xquery

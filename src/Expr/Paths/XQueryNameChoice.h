@@ -1,0 +1,64 @@
+// The names that a step takes where it takes several, or where a predicate says which: the step
+// "(a | b)", and "*[self::a or self::b]", "*[name() = ('a', 'b')]", "*[local-name() = 'a']".
+//
+// A planner gives a step its choice (XQueryAxisStep::setChoice); what the query says in its place
+// is evaluated no more.
+#pragma once
+
+#include "Expr/Paths/XQueryNameTest.h"
+#include "Platform/Tree/NameIndex.h"
+#include "xquery/String.h"
+#include "xquery/XMLNode.h"
+
+#include <utility>
+#include <vector>
+
+namespace xquery {
+
+class XQueryNameChoice final : public NSXMLNameSelection {
+ public:
+  enum class By : uint8_t {
+    Test,       // an element or attribute as a name test finds it
+    LocalName,  // any node whose local name is the text
+    Name,       // any node whose name is the text, with its prefix
+  };
+
+  // A test that cannot raise an error.
+  void addTest(Ref<XQueryNameTest> test) {
+    _alternatives.push_back({By::Test, std::move(test), {}});
+  }
+  // By::LocalName or By::Name; the text is not empty.
+  void addText(By by, Ref<NSString> text) { _alternatives.push_back({by, {}, std::move(text)}); }
+  void add(const XQueryNameChoice& others) {
+    _alternatives.insert(_alternatives.end(), others._alternatives.begin(),
+                         others._alternatives.end());
+  }
+  bool isEmpty() const { return _alternatives.empty(); }
+  size_t count() const { return _alternatives.size(); }
+
+  // Whether elements and attributes alone can have one of the names.
+  bool isOfTests() const;
+  // The only name; null where there are several or it is a text.
+  const XQueryNameTest* onlyTest() const;
+  // Whether the names depend on the namespaces of the context: of one with a default namespace.
+  bool needsContext() const;
+  bool accepts(const NSXMLNode& node, XQueryContext* context) const;
+
+  // As a step would be written: "(a | b)".
+  Ref<NSString> description() const;
+
+  // For an index, where no context is needed.
+  bool mayTake(const NSXMLExpandedName& name) const override;
+  bool takes(const NSXMLNode& node) const override { return accepts(node, nullptr); }
+
+ private:
+  struct Alternative {
+    By by;
+    Ref<XQueryNameTest> test;
+    Ref<NSString> text;
+  };
+
+  std::vector<Alternative> _alternatives;
+};
+
+}  // namespace xquery

@@ -1,0 +1,34 @@
+// A path of whose nodes only the first ones are asked for, by who stands around it.
+#pragma once
+
+#include "Expr/Paths/XQueryPath.h"
+#include "Plan/Operators/XQueryPlannedExpr.h"
+
+#include <cstdint>
+#include <utility>
+
+namespace xquery {
+
+class XQueryFirstNodes : public XQueryPlannedExpr {
+ public:
+  // The path findsInOrder.
+  [[nodiscard]] static Ref<XQueryFirstNodes> exprWithPlain(Ref<XQueryPathExpr> path,
+                                                           uint64_t most) {
+    return make<XQueryFirstNodes>(std::move(path), most);
+  }
+
+  // The value of the path, without some of the nodes behind the first so many.
+  Value computeValue(XQueryContext& context) const override;
+
+ protected:
+  XQueryFirstNodes(Ref<XQueryPathExpr> path, uint64_t most)
+      : XQueryPlannedExpr(path), _path(std::move(path)), _most(most) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  const Ref<XQueryPathExpr> _path;
+  const uint64_t _most;
+};
+
+}  // namespace xquery

@@ -1,0 +1,24 @@
+// Conditions on the position of the context item, and small numbers.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+
+namespace xquery {
+
+class XQueryExpr;
+
+// The integer that a literal is, in parentheses or not, unless it is a large one.
+std::optional<int64_t> XQuerySmallIntegerIn(const XQueryExpr* expr);
+
+// The comparison that the operands of another one stand in when they change sides.
+int XQueryMirroredComparison(int type);
+
+// "position() = 3", "3 >= position()" with the position on the left.
+struct XQueryPositionCondition {
+  int comparison;
+  int64_t number;
+};
+std::optional<XQueryPositionCondition> XQueryPositionConditionIn(const XQueryExpr& expr);
+
+}  // namespace xquery
