@@ -4,6 +4,7 @@
 #include "Types/XQueryNodeFunctions.h"
 
 #include <algorithm>
+#include <limits>
 
 namespace xquery {
 
@@ -29,16 +30,37 @@ Ref<NSString> textOf(const NSXMLNode* base) {
   return text ? text : NSString::empty();
 }
 
-}  // namespace
+struct Climb {
+  const NSXMLNode* base;     // the nearest; null for none on the way
+  const NSXMLElement* next;  // where the climb goes on, unless it is over
+};
 
-Ref<NSString> XQueryBaseURIs::ofNode(const NSXMLNode* node) {
-  constexpr int shortClimb = 32;
-  const NSXMLElement* element = firstElement(node);
-  for (int level = 0; element && level < shortClimb; ++level) {
-    if (const NSXMLNode* base = ownBase(element)) return textOf(base);
+Climb climb(const NSXMLElement* element, size_t mostLevels) {
+  WorkPacer pacer;
+  for (; element && mostLevels; --mostLevels) {
+    pacer.turn();
+    if (const NSXMLNode* base = ownBase(element)) return {base, nullptr};
     element = elementAbove(element);
   }
-  return element ? ofDeepElement(element) : NSString::empty();
+  return {nullptr, element};
+}
+
+Ref<NSString> textAtTheEndOfTheClimb(const NSXMLElement* element) {
+  return textOf(climb(element, std::numeric_limits<size_t>::max()).base);
+}
+
+}  // namespace
+
+// A base URI is taken as written: relative ones are not resolved against outer ones, and the
+// document's own URI plays no part.
+Ref<NSString> XQueryNodeBaseURI(const NSXMLNode* node) {
+  return textAtTheEndOfTheClimb(firstElement(node));
+}
+
+Ref<NSString> XQueryBaseURIs::ofNode(const NSXMLNode* node) {
+  constexpr size_t shortClimb = 32;
+  const Climb climbed = climb(firstElement(node), shortClimb);
+  return climbed.next ? ofDeepElement(climbed.next) : textOf(climbed.base);
 }
 
 Ref<NSString> XQueryBaseURIs::ofDeepElement(const NSXMLElement* element) {
@@ -46,7 +68,7 @@ Ref<NSString> XQueryBaseURIs::ofDeepElement(const NSXMLElement* element) {
     clear();
     _tree = NSXMLTreeIndexes::of(element);
   }
-  if (!_tree) return XQueryNodeBaseURI(element);
+  if (!_tree) return textAtTheEndOfTheClimb(element);
   NSXMLIndexList<const NSXMLElement*> climbed;
   WorkPacer pacer;
   size_t kept = 0;

@@ -191,26 +191,6 @@ Ref<NSString> XQueryNodeLanguage(const NSXMLNode* node) {
   return nullptr;
 }
 
-// A base URI is taken as written: relative ones are not resolved against outer ones, and the
-// document's own URI plays no part.
-Ref<NSString> XQueryNodeBaseURI(const NSXMLNode* node) {
-  WorkPacer pacer;
-  while (node) {
-    pacer.turn();
-    if (node->kind() == Kind::Document) {
-      node = cast<NSXMLDocument>(node)->rootElement();
-      continue;
-    }
-    if (const NSXMLNode* base = attributeNamed(node, "xml:base")) {
-      return textOrEmpty(base->stringValue());
-    }
-    const NSXMLNode* parent = node->parent();
-    if (node->kind() == Kind::Element && !isa<NSXMLElement>(parent)) break;
-    node = parent;
-  }
-  return NSString::empty();
-}
-
 Ref<NSString> XQueryNodeDocumentURI(const NSXMLNode* node) {
   const NSXMLDocument* document = node ? node->rootDocument() : nullptr;
   return textOrEmpty(document ? document->documentURI() : nullptr);

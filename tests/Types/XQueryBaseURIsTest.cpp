@@ -35,9 +35,25 @@ std::vector<const NSXMLNode*> nodesOf(const NSXMLNode* root) {
   return nodes;
 }
 
+// The rule, step by step.
+std::string plainBaseURI(const NSXMLNode* node) {
+  if (const auto* document = dyn_cast<NSXMLDocument>(node)) node = document->rootElement();
+  if (node && isa<NSXMLDocument>(node->parent()) && !isa<NSXMLElement>(node)) {
+    node = cast<NSXMLDocument>(node->parent())->rootElement();
+  }
+  for (; node; node = node->parent()) {
+    const auto* element = dyn_cast<NSXMLElement>(node);
+    const NSXMLNode* base = element ? element->attributeForName(view("xml:base")) : nullptr;
+    if (base) return utf8(base->stringValue());
+  }
+  return "";
+}
+
 void expectAlike(XQueryBaseURIs& baseURIs, const std::vector<const NSXMLNode*>& nodes) {
   for (const NSXMLNode* node : nodes) {
-    ASSERT_EQ(utf8(baseURIs.ofNode(node)), utf8(XQueryNodeBaseURI(node)));
+    const std::string plain = plainBaseURI(node);
+    ASSERT_EQ(utf8(baseURIs.ofNode(node)), plain);
+    ASSERT_EQ(utf8(XQueryNodeBaseURI(node)), plain);
   }
 }
 
