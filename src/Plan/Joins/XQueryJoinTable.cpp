@@ -1,6 +1,7 @@
 #include "Plan/Joins/XQueryJoinTable.h"
 
 #include "Expr/XQuerySequence.h"
+#include "Platform/Base/KeyedHash.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryTypeTable.h"
@@ -35,8 +36,7 @@ bool isExactAsDouble(const NSNumber& number) {
 
 uint32_t hashOfDouble(double value) {
   // The two zeros are equal.
-  const auto bits = std::bit_cast<uint64_t>(value == 0 ? 0.0 : value);
-  return static_cast<uint32_t>((bits * 0x9E3779B97F4A7C15U) >> 32U);
+  return static_cast<uint32_t>(keyedHash(std::bit_cast<uint64_t>(value == 0 ? 0.0 : value)));
 }
 
 uint32_t hashOfNode(const NSObject* node) {

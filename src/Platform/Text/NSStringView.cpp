@@ -2,6 +2,7 @@
 //
 // Both representations give the same answers. 8-bit text against 8-bit text, the common case, goes
 // through the C library's byte functions; the other pairings share one implementation per question.
+#include "Platform/Base/KeyedHash.h"
 #include "Platform/Text/Blocks.h"
 #include "Platform/Text/UTF16.h"
 #include "xquery/String.h"
@@ -180,25 +181,34 @@ uint64_t fourUnits(const char16_t* units) {
   return word;
 }
 
+// The last eight units or fewer; where there are less than eight, the two words share some.
+template <class Unit>
+uint64_t mixedEnd(const HashSecrets& secrets, uint64_t hash, const Unit* units, uint32_t count) {
+  if (count >= 4) {
+    return mixedHash(secrets, hash, fourUnits(units), fourUnits(units + count - 4));
+  }
+  uint64_t word = 0;
+  for (uint32_t index = 0; index < count; ++index) word = word << 16 | widened(units[index]);
+  return mixedHash(secrets, hash, word, 0);
+}
+
+// Texts of different lengths may have the same words; the length tells them apart.
 template <class Unit>
 uint32_t hashUnits(const Unit* units, uint32_t length) {
-  static_assert(unitsPerBlock % 4 == 0);
-  constexpr uint64_t multiplier = 0x9E3779B97F4A7C15ULL;
-  uint64_t hash = length * multiplier;
+  constexpr uint32_t unitsAtOnce = 8;
+  static_assert(unitsPerBlock % unitsAtOnce == 0);
+  const HashSecrets& secrets = hashSecrets();
+  uint64_t hash = secrets.start;
+  uint32_t index = 0;
   untilDone(length, [&](uint32_t from, uint32_t count) {
     const uint32_t end = from + count;
-    uint32_t index = from;
-    for (; index + 4 <= end; index += 4) {
-      hash = (hash ^ fourUnits(units + index)) * multiplier;
-      hash ^= hash >> 32;
-    }
-    for (; index < end; ++index) {
-      hash = (hash ^ widened(units[index])) * multiplier;
-      hash ^= hash >> 32;
+    for (; index + unitsAtOnce < end; index += unitsAtOnce) {
+      hash = mixedHash(secrets, hash, fourUnits(units + index), fourUnits(units + index + 4));
     }
     return false;
   });
-  return static_cast<uint32_t>(hash);
+  hash = mixedEnd(secrets, hash, units + index, length - index);
+  return static_cast<uint32_t>(foldedProduct(hash ^ length, secrets.right));
 }
 
 void appendUTF8(std::string& out, char32_t point) {

@@ -3,9 +3,10 @@
 // Each table is split into shards, each with a lock of its own, and a shard is looked up by text. A
 // name holds its expanded name, which holds its URI. The last count is given up under the lock of
 // the shard, so that a name found there under the lock is alive; counts above one change without
-// it. Hashes start from a random seed: whoever writes a document cannot choose names that collide.
+// it. Hashes are keyed: whoever writes a document cannot choose names that collide.
 #include "Platform/Tree/Names.h"
 
+#include "Platform/Base/KeyedHash.h"
 #include "Platform/Tree/Credit.h"
 
 #include <algorithm>
@@ -13,7 +14,6 @@
 #include <cstdlib>
 #include <mutex>
 #include <new>
-#include <sys/random.h>
 #include <unordered_set>
 
 namespace xquery {
@@ -28,29 +28,16 @@ namespace {
 
 // --- hashing ---------------------------------------------------------------------------------
 
-uint64_t randomSeed() {
-  uint64_t seed = 0;
-  if (getentropy(&seed, sizeof seed) != 0) seed = reinterpret_cast<uintptr_t>(&seed);
-  return seed | 1;
-}
-
-uint64_t mixed(uint64_t a, uint64_t b) {
-  __extension__ using Wide = unsigned __int128;
-  const Wide product = static_cast<Wide>(a) * b;
-  return static_cast<uint64_t>(product) ^ static_cast<uint64_t>(product >> 64);
-}
-
 uint64_t hashText(NSStringView text, uint64_t start) {
-  static const uint64_t seed = randomSeed();
-  constexpr uint64_t multiplier = 0x9E3779B97F4A7C15ULL;
+  const HashSecrets& secrets = hashSecrets();
   const size_t size = size_t{text.length()} * (text.isWide() ? sizeof(char16_t) : 1);
   const char* bytes =
       text.isWide() ? reinterpret_cast<const char*>(text.wideUnits()) : text.asciiUnits();
-  uint64_t hash = mixed(start ^ seed, multiplier ^ size);
+  uint64_t hash = mixedHash(secrets, secrets.start, start, size);
   for (size_t at = 0; at < size; at += sizeof(uint64_t)) {
     uint64_t word = 0;
     std::memcpy(&word, bytes + at, size - at < sizeof word ? size - at : sizeof word);
-    hash = mixed(hash ^ word ^ seed, multiplier ^ (hash >> 32));
+    hash = mixedHash(secrets, hash, word, 0);
   }
   return hash;
 }

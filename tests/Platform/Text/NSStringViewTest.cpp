@@ -2,12 +2,14 @@
 // all four pairings over generated texts and compare with a plain implementation.
 #include "Platform/Base/ProcessorTime.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Text/TextTestSupport.h"
 #include "xquery/String.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <random>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -285,6 +287,30 @@ TEST(StringView, ConversionsGiveTheText) {
   }
   EXPECT_EQ(NSStringView().utf8(), "");
   EXPECT_EQ(NSStringView().utf16(), u"");
+}
+
+// Whoever knows how four units are multiplied in can choose four more that undo them.
+TEST(StringView, TextsMadeToMeetInAnUnkeyedHashDoNotMeet) {
+  std::set<uint32_t> hashes;
+  constexpr size_t count = 5000;
+  for (const std::u16string& text : meetingTexts(count)) {
+    hashes.insert(Both::wideView(text).hash());
+  }
+  EXPECT_GE(hashes.size(), count - 2);
+}
+
+TEST(StringView, TheHashOfEveryLengthDependsOnEveryUnit) {
+  for (size_t length = 1; length < 40; ++length) {
+    const std::string text(length, 'm');
+    std::set<uint32_t> hashes = {NSStringView::ascii(text).hash(),
+                                 NSStringView::ascii(text + std::string(1, '\0')).hash()};
+    for (size_t place = 0; place < length; ++place) {
+      std::string other = text;
+      other[place] = 'n';
+      hashes.insert(NSStringView::ascii(other).hash());
+    }
+    EXPECT_EQ(hashes.size(), length + 2);
+  }
 }
 
 }  // namespace
