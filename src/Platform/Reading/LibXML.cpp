@@ -53,6 +53,7 @@ class Parse {
   void failAt(const char* message, int64_t line, int64_t column);
   void note(const char* message, int64_t line, int64_t column);  // the first failure counts
   void end(std::exception_ptr exception);                        // counts as a failure
+  void endInput();
   bool hasReadAll();
   size_t position() const;  // of the parser, in the document's text
   void hasEvent();
@@ -200,6 +201,7 @@ class Parse::Hearing {
   ~Hearing() {
     xmlSetGenericErrorFunc(_genericContext, _generic);
     xmlSetStructuredErrorFunc(_structuredContext, _structured);
+    xmlResetLastError();  // which may hold all of a long text
     current = _outer;
   }
   Hearing(const Hearing&) = delete;
@@ -241,7 +243,13 @@ void Parse::hear(const xmlError& error) {
 // --- input -----------------------------------------------------------------------------------
 
 // The parser cannot be stopped here, since stopping frees the buffer that is being filled; after a
-// failure it sees the end of the input.
+// failure it sees the end of the input. It is told that this is the end of its work as well: to
+// report what is unfinished it would copy all of that, twice.
+void Parse::endInput() {
+  _parser->disableSAX = 1;
+  _parser->instate = XML_PARSER_EOF;
+}
+
 int Parse::readInput(void* self, char* buffer, int size) {
   Parse& parse = *static_cast<Parse*>(self);
   if (parse._failed || parse._reachedEnd) return 0;
@@ -254,12 +262,12 @@ int Parse::readInput(void* self, char* buffer, int size) {
   } catch (...) {
     parse.end(std::current_exception());
   }
-  if (count < 0) {
-    parse.note("the input cannot be read", 0, 0);
+  if (count < 0) parse.note("the input cannot be read", 0, 0);
+  if (!parse._failed) parse.measureInput();
+  if (parse._failed) {
+    parse.endInput();
     return 0;
   }
-  parse.measureInput();
-  if (parse._failed) return 0;
   if (count == 0) parse._reachedEnd = true;
   parse._bytesRead += static_cast<size_t>(count);
   return static_cast<int>(count);
@@ -554,22 +562,14 @@ xmlSAXHandler Parse::callbacks() {
 
 // --- the whole -------------------------------------------------------------------------------
 
-struct FreeParser {
-  void operator()(xmlParserCtxt* parser) const {
-    xmlFreeDoc(parser->myDoc);
-    parser->myDoc = nullptr;
-    xmlFreeParserCtxt(parser);
-  }
-};
-
 bool Parse::run() {
   const Hearing hearing(*this);
-  const LibXMLValueBytes counted;
+  LibXMLValueBytes counted;
   xmlSAXHandler handler = callbacks();
-  const std::unique_ptr<xmlParserCtxt, FreeParser> parser(
-      xmlCreateIOParserCtxt(&handler, nullptr, readInput, nullptr, this, XML_CHAR_ENCODING_NONE));
-  if (!parser) throw std::bad_alloc();
-  _parser = _atWork = parser.get();
+  _parser = _atWork =
+      xmlCreateIOParserCtxt(&handler, nullptr, readInput, nullptr, this, XML_CHAR_ENCODING_NONE);
+  if (!_parser) throw std::bad_alloc();
+  const LibXMLOwnedParser owned(_parser, counted);
   _parser->_private = this;
   xmlCtxtUseOptions(_parser, XML_PARSE_HUGE | XML_PARSE_NOENT | XML_PARSE_NONET);
   const bool isWellFormed = xmlParseDocument(_parser) == 0 && _parser->wellFormed;

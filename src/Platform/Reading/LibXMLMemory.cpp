@@ -1,13 +1,18 @@
 #include "Platform/Reading/LibXMLMemory.h"
 
+#include "Platform/Base/Abandoned.h"
 #include "Platform/Base/WorkMeter.h"
 
 #include <libxml/parser.h>
+#include <libxml/tree.h>
 #include <libxml/xmlmemory.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <malloc.h>
+#include <memory>
 #include <mutex>
+#include <new>
 
 namespace xquery {
 
@@ -57,9 +62,10 @@ void replace(const Functions& before, const Functions& after) {
 
 struct LeftBehind {
   ~LeftBehind() {
-    if (count == 0) replace(counting, plain);
+    if (threads == 0 && parsers == 0) replace(counting, plain);
   }
-  std::atomic<int> count = 0;
+  std::atomic<int> threads = 0;
+  std::atomic<int> parsers = 0;  // set aside to be freed
 };
 LeftBehind leftBehind;
 
@@ -82,7 +88,7 @@ void LibXMLMemory::begin() {
 }
 
 std::atomic<int>& LibXMLMemory::threadsLeftBehind() {
-  return leftBehind.count;
+  return leftBehind.threads;
 }
 
 LibXMLValueBytes::~LibXMLValueBytes() {
@@ -93,6 +99,52 @@ void LibXMLValueBytes::noteBytes(int64_t more) {
   _bytes += more;
   workMeter.valueBytes += more;
   if (workMeter.valueBytes > workMeter.mostValueBytes) workMeter.stepsLeft = 0;
+}
+
+namespace {
+
+void freeWithDocument(xmlParserCtxt* parser) {
+  xmlFreeDoc(parser->myDoc);
+  parser->myDoc = nullptr;
+  xmlFreeParserCtxt(parser);
+}
+
+struct LeftParser {
+  xmlParserCtxt* parser;
+  int64_t bytes;
+};
+
+void freeLeft(const void* argument) {
+  const std::unique_ptr<const LeftParser> left(static_cast<const LeftParser*>(argument));
+  {
+    const LibXMLValueBytes apart;  // whatever else is being counted
+    freeWithDocument(left->parser);
+  }
+  uncountValueBytes(static_cast<size_t>(left->bytes));
+  --leftBehind.parsers;
+}
+
+}  // namespace
+
+LibXMLOwnedParser::~LibXMLOwnedParser() {
+  if (!isSetAside()) freeWithDocument(_parser);
+}
+
+bool LibXMLOwnedParser::isSetAside() noexcept {
+  if (!abandonedValues || !abandonedValues->isOver()) return false;
+  // An entry of a table and a short text.
+  constexpr int64_t bytesOfAPart = 64;
+  const int64_t bytes = std::max(_counted.bytes(), int64_t{0});
+  std::unique_ptr<LeftParser> left(new (std::nothrow) LeftParser{_parser, bytes});
+  if (!left) return false;
+  ++leftBehind.parsers;
+  if (!abandonedValues->take(left.get(), freeLeft, static_cast<size_t>(bytes / bytesOfAPart))) {
+    --leftBehind.parsers;
+    return false;
+  }
+  static_cast<void>(left.release());
+  _counted.leaveCounted();
+  return true;
 }
 
 }  // namespace xquery

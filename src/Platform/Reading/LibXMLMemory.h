@@ -10,6 +10,8 @@
 #include <atomic>
 #include <cstdint>
 
+struct _xmlParserCtxt;
+
 namespace xquery {
 
 class LibXMLMemory {
@@ -40,7 +42,7 @@ class LibXMLMemory {
 
   // Threads that nobody waits for any more and that still work with libxml2. It releases what it
   // shares when the process ends, whoever still uses it, unless its memory comes from somebody
-  // else: where there are such threads the allocator stays ours.
+  // else: where there are such threads, or parsers to be freed, the allocator stays ours.
   static std::atomic<int>& threadsLeftBehind();
 };
 
@@ -52,9 +54,31 @@ class LibXMLValueBytes final : public LibXMLMemory::Counter {
   ~LibXMLValueBytes();
   void noteBytes(int64_t more) override;
 
+  int64_t bytes() const { return _bytes; }
+  // Who gives back what is left uncounts it.
+  void leaveCounted() { _bytes = 0; }
+
  private:
   int64_t _bytes = 0;
   const LibXMLMemory::CountedBy _counting;
+};
+
+// Frees a parser and its document, which are of names and entities blocks without number: where the
+// evaluation is over, when nobody waits for it any more.
+class LibXMLOwnedParser {
+ public:
+  // `counted` knows what was taken for the parser.
+  LibXMLOwnedParser(_xmlParserCtxt* parser, LibXMLValueBytes& counted)
+      : _parser(parser), _counted(counted) {}
+  ~LibXMLOwnedParser();
+  LibXMLOwnedParser(const LibXMLOwnedParser&) = delete;
+  LibXMLOwnedParser& operator=(const LibXMLOwnedParser&) = delete;
+
+ private:
+  bool isSetAside() noexcept;
+
+  _xmlParserCtxt* const _parser;
+  LibXMLValueBytes& _counted;
 };
 
 }  // namespace xquery

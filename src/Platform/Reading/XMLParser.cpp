@@ -6,8 +6,10 @@
 // one document, so that the process's table of names is asked once per name and document.
 #include "Platform/Base/CountedBytes.h"
 #include "Platform/Base/Stack.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Platform/Reading/LibXML.h"
 #include "Platform/Reading/Tidy.h"
+#include "Platform/Text/Blocks.h"
 #include "Platform/Text/UTF8.h"
 #include "Platform/Tree/Names.h"
 #include "Platform/Tree/TreeBuilder.h"
@@ -35,17 +37,21 @@ constexpr const char* tooLong = "a text is too long";
 // first byte of a four-byte form another.
 size_t unitCount(std::string_view text) {
   size_t count = 0;
-  for (const char byte : text) {
-    const auto bits = static_cast<unsigned char>(byte);
-    count += ((bits & 0xC0U) != 0x80U) + (bits >= 0xF0U);
-  }
+  inBlocks(text, [&count](std::string_view block) {
+    for (const char byte : block) {
+      const auto bits = static_cast<unsigned char>(byte);
+      count += ((bits & 0xC0U) != 0x80U) + (bits >= 0xF0U);
+    }
+  });
   return count;
 }
 
 void widen(std::string_view text, char16_t* units) {
   const auto* at = reinterpret_cast<const unsigned char*>(text.data());
   const unsigned char* end = at + text.size();
+  WorkPacer pacer;
   while (at < end) {
+    pacer.turn();
     const char32_t point = readUTF8(at, end);
     if (point < 0x10000) {
       *units++ = static_cast<char16_t>(point);
@@ -185,8 +191,7 @@ class TreeHandler final : public LibXMLHandler {
   NameCache _names;
   std::unordered_map<LibXMLText, NSStringView> _URIs;
   std::vector<SpaceChange> _spaceChanges;
-  std::string _pending;  // text not yet stored, UTF-8
-  CountedBytes _pendingBytes;
+  ValueText<char> _pending;      // text not yet stored, UTF-8
   bool _pendingIsExact = false;  // some of it came from a CDATA section: kept whatever it is
 };
 
@@ -200,7 +205,11 @@ NSStringView TreeHandler::stored(std::string_view text) {
   if (count > mostUnits) throw LibXMLStop{tooLong};
   void* units = _builder.tree().allocateText(isNarrow ? count : count * sizeof(char16_t));
   if (isNarrow) {
-    if (count) std::memcpy(units, text.data(), count);
+    auto* to = static_cast<char*>(units);
+    inBlocks(text, [&to](std::string_view block) {
+      if (!block.empty()) std::memcpy(to, block.data(), block.size());
+      to += block.size();
+    });
     return {static_cast<const char*>(units), static_cast<uint32_t>(count)};
   }
   widen(text, static_cast<char16_t*>(units));
@@ -215,9 +224,7 @@ NSStringView TreeHandler::storedURI(LibXMLText URI) {
 }
 
 void TreeHandler::gather(std::string_view text) {
-  const size_t before = _pending.capacity();
-  _pending.append(text);
-  if (_pending.capacity() != before) _pendingBytes.set(_pending.capacity());
+  appendInBlocks(_pending, text);
 }
 
 bool TreeHandler::isPendingKept() const {
@@ -232,8 +239,7 @@ void TreeHandler::addText(bool isCDATA) {
   // A huge text must not hold its memory a second time until the end.
   constexpr size_t kept = size_t{1} << 20;
   if (_pending.capacity() > kept) {
-    std::string().swap(_pending);
-    _pendingBytes.set(0);
+    ValueText<char>().swap(_pending);
   }
   _pending.clear();
   _pendingIsExact = false;

@@ -115,12 +115,29 @@ NSXMLTree* NSXMLTree::create() {
   return ::new (NSCounted::operator new(sizeof(NSXMLTree))) NSXMLTree;
 }
 
+// Whether the tree, or what is left of it, is freed later. Releasing a name takes as long as
+// freeing a few blocks, and there may be as many as there are nodes.
+bool NSXMLTree::isSetAside() {
+  const auto free = [](const void* tree) {
+    static_cast<NSXMLTree*>(const_cast<void*>(tree))->destroy();
+  };
+  AbandonedValues& abandoned = *abandonedValues;
+  NSXMLTreeExtra* const state = extra();
+  size_t names = state ? state->names.count() : 0;
+  while (!abandoned.take(this, free, blockCount() + names)) {
+    if (names <= AbandonedValues::partsPerLook) return false;
+    dropIndexes();
+    state->names.takeOut(AbandonedValues::partsPerLook,
+                         [](const NSXMLName* name) { NSXMLReleaseName(name); });
+    names = state->names.count();
+    abandoned.isOver();
+  }
+  return true;
+}
+
 void NSXMLTree::destroy() {
-  if (abandonedValues) [[unlikely]] {
-    const auto free = [](const void* tree) {
-      static_cast<NSXMLTree*>(const_cast<void*>(tree))->destroy();
-    };
-    if (abandonedValues->take(this, free, blockCount())) return;
+  if (abandonedValues && isSetAside()) [[unlikely]] {
+    return;
   }
   dropIndexes();
   if (NSXMLTreeExtra* present = extra()) {

@@ -235,6 +235,7 @@ class NSXMLTree : public NSXMLTreeHead {
   void setBlockCount(uint64_t count);
   NSXMLBlock* allocateBlock(size_t bytes);
   void freeBlocks();
+  bool isSetAside();
   void* allocateNode(size_t bytes, size_t textBytes, uint16_t& distance);
   void* allocateBulkNode(size_t bytes, uint16_t& distance);
   template <class Node, class... Arguments>

@@ -84,6 +84,17 @@ class NSXMLNameSet {
       if (name) function(name);
     }
   }
+  // Up to so many, which leave the set; after that it is good for nothing but going over the
+  // others.
+  template <class Function>
+  void takeOut(size_t most, Function function) {
+    for (; most && !_places.empty(); _places.pop_back()) {
+      if (!_places.back()) continue;
+      function(_places.back());
+      --_count;
+      --most;
+    }
+  }
 
  private:
   static constexpr size_t longestList = 8;

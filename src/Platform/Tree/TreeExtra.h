@@ -4,6 +4,7 @@
 // is kept in the tree itself, a few in a block of the object allocator, and more in the extra part.
 #pragma once
 
+#include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/Names.h"
 
@@ -30,6 +31,15 @@ struct NSXMLNameList {
 };
 
 struct NSXMLTreeExtra {
+  NSXMLTreeExtra() = default;
+  ~NSXMLTreeExtra() { uncountValueBytes(_nameBytes); }
+  NSXMLTreeExtra(const NSXMLTreeExtra&) = delete;
+  NSXMLTreeExtra& operator=(const NSXMLTreeExtra&) = delete;
+
+  // One that is not there yet. A tree of very many names mostly is the only one that has them, so
+  // that they count like its nodes.
+  void insert(const NSXMLName* name);
+
   // Where the next node and text of a tree that grows in bulk go.
   bool isBulk = false;
   char* nodeBlock = nullptr;
@@ -42,6 +52,9 @@ struct NSXMLTreeExtra {
 
   NSXMLNameSet names;
   std::vector<NSXMLDocument*> documents;  // those with a URI
+
+ private:
+  size_t _nameBytes = 0;
 };
 
 inline NSXMLTreeExtra* NSXMLTree::extra() const {

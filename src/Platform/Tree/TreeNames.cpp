@@ -32,12 +32,22 @@ void NSXMLTree::setNameList(NSXMLNameList* list) {
   _extra = reinterpret_cast<uintptr_t>(list) | listTag;
 }
 
+// Of the name as written and of its expanded name: the entry, its text, its place in the table.
+void NSXMLTreeExtra::insert(const NSXMLName* name) {
+  constexpr size_t bytesOfAPlace = 64;
+  const size_t bytes = sizeof(NSXMLName) + sizeof(NSXMLExpandedName) + 2 * bytesOfAPlace +
+                       name->text.length() + name->expanded->localName.length();
+  names.insert(name);
+  _nameBytes += bytes;
+  countValueBytes(bytes);
+}
+
 // --- the names of a tree -------------------------------------------------------------------------
 
 NSXMLTreeExtra& NSXMLTree::makeExtra() {
   if (NSXMLTreeExtra* present = extra()) return *present;
   auto made = std::make_unique<NSXMLTreeExtra>();
-  forEachName([&](const NSXMLName* name) { made->names.insert(name); });
+  forEachName([&](const NSXMLName* name) { made->insert(name); });
   freeExtra();
   _extra = reinterpret_cast<uintptr_t>(made.get());
   return *made.release();
@@ -61,7 +71,7 @@ void NSXMLTree::adopt(const NSXMLName* name) {
   NSXMLNameList* list = nameList();
   const bool isListFull = list && list->count == list->capacity;
   if (extra() || (isListFull && list->capacity == NSXMLNameList::longest)) {
-    makeExtra().names.insert(name);
+    makeExtra().insert(name);
     return;
   }
   if (!list || isListFull) {

@@ -1,11 +1,13 @@
 #include "Platform/Base/Abandoned.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Names.h"
 #include "xquery/Collection.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <string>
 #include <thread>
 #include <vector>
 
@@ -131,6 +133,45 @@ TEST_F(Abandoned, UntilALimitIsReachedTreesOfVeryManyBlocksAreFreedInParts) {
               static_cast<double>(with - before) / 3, static_cast<double>(with - before) / 10);
   abandoned.freeHere();
   EXPECT_EQ(workMeter.valueBytes, before);
+}
+
+Ref<NSXMLDocument> documentOfManyNames(size_t count) {
+  std::string text = "<r>";
+  for (size_t index = 0; index < count; ++index) text += "<e" + std::to_string(index) + "/>";
+  return NSXMLDocument::documentWithData(text + "</r>", 0);
+}
+
+// Its nodes are in a few large blocks.
+TEST_F(Abandoned, ATreeOfManyNamesGoesWhole) {
+  const size_t before = NSXMLInternedNameCount();
+  auto document = documentOfManyNames(AbandonedValues::manyPartsInAll);
+  const size_t with = NSXMLInternedNameCount();
+  EXPECT_GE(with, before + AbandonedValues::manyPartsInAll);
+  {
+    AbandonedValues abandoned;
+    abandonedValues = &abandoned;
+    document = nullptr;
+    abandonedValues = nullptr;
+    EXPECT_EQ(NSXMLInternedNameCount(), with);
+  }
+  waitForAbandonedValues();
+  EXPECT_EQ(NSXMLInternedNameCount(), before);
+}
+
+TEST_F(Abandoned, UntilALimitIsReachedVeryManyNamesAreReleasedInParts) {
+  const size_t before = NSXMLInternedNameCount();
+  auto document = documentOfManyNames(3 * AbandonedValues::partsPerLook);
+  const size_t with = NSXMLInternedNameCount();
+  int turnsLeft = 2;
+  AbandonedValues abandoned(isOverNow, &turnsLeft);
+  abandonedValues = &abandoned;
+  document = nullptr;
+  abandonedValues = nullptr;
+  EXPECT_EQ(turnsLeft, 0);
+  EXPECT_NEAR(static_cast<double>(NSXMLInternedNameCount() - before),
+              static_cast<double>(with - before) / 3, 10);
+  abandoned.freeHere();
+  EXPECT_EQ(NSXMLInternedNameCount(), before);
 }
 
 // The lists hold nodes of a tree that the host goes on changing.

@@ -1,4 +1,5 @@
 // What libxml2 takes while it reads counts like memory of our own.
+#include "Platform/Base/Abandoned.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Reading/IgnorantHandler.h"
 #include "Platform/Reading/LibXML.h"
@@ -6,10 +7,12 @@
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
+#include <libxml/xmlerror.h>
 #include <libxml/xmlmemory.h>
 
 #include <algorithm>
 #include <functional>
+#include <span>
 #include <string>
 #include <thread>
 
@@ -110,11 +113,47 @@ TEST(LibXMLMemory, CountsWhileADocumentIsRead) {
   }
 }
 
+// The last of them go on in small blocks; one large block goes at once.
+TEST(LibXMLMemory, WhatAnEndedParserHasIsFreedByAnotherThreadAndCountedUntilThen) {
+  waitForAbandonedValues();
+  settleAbandonedValues();
+  for (const Endless& document : std::span(endless).last(5)) {
+    const int64_t before = workMeter.valueBytes;
+    {
+      AbandonedValues abandoned;
+      abandonedValues = &abandoned;
+      EXPECT_TRUE(isEnded(document, 2 * MiB, size_t{16} << 20)) << document.what;
+      abandonedValues = nullptr;
+      EXPECT_GE(workMeter.valueBytes, before + 3 * MiB / 2) << document.what;
+    }
+    waitForAbandonedValues();
+    settleAbandonedValues();
+    EXPECT_EQ(workMeter.valueBytes, before) << document.what;
+  }
+}
+
+// libxml2 keeps the last error of a thread, and with it the text that was at fault.
+TEST(LibXMLMemory, IsGivenBackWhereADocumentFails) {
+  for (const std::string beginning : {"<a><![CDATA[", "<a><!--", "<a b='", "<a><?b "}) {
+    EXPECT_FALSE(NSXMLDocument::documentWithData(beginning + std::string(MiB, 'c'), 0));
+    const xmlError* const last = xmlGetLastError();
+    EXPECT_TRUE(!last || !last->str1) << beginning;
+  }
+}
+
 TEST(LibXMLMemory, TextThatIsNotYetANodeCounts) {
   const std::string text = "<a>" + std::string(8 * MiB, 'b') + "</a>";
   const Ceiling watching(1024 * MiB);
   EXPECT_TRUE(NSXMLDocument::documentWithData(text, 0));
   EXPECT_GE(watching.most(), 7 * MiB);
+}
+
+TEST(LibXMLMemory, RoomForTextIsCountedBeforeItIsTaken) {
+  const std::string text = "<a>" + std::string(6 * MiB, 'b') + "</a>";
+  const Ceiling watching(3 * MiB);
+  EXPECT_FALSE(NSXMLDocument::documentWithData(text, 0));
+  EXPECT_TRUE(workMeter.wasRefused);
+  EXPECT_LE(watching.most(), 3 * MiB);
 }
 
 TEST(LibXMLMemory, IsOfTheThreadThatReads) {
