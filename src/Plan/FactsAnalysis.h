@@ -32,8 +32,11 @@ class XQueryFactTable {
   bool summarize();
 
   const XQueryProgram& _program;
-  std::vector<XQueryFacts> _facts;
-  std::unordered_map<const XQueryFunctionDecl*, XQueryFacts> _functions;
+  using Function = const XQueryFunctionDecl*;
+  XQueryPlanList<XQueryFacts> _facts;
+  std::unordered_map<Function, XQueryFacts, std::hash<Function>, std::equal_to<>,
+                     ValueAllocator<std::pair<const Function, XQueryFacts>>>
+      _functions;
 };
 
 // One place while its facts are found. Those of its parts are known.

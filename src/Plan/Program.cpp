@@ -113,9 +113,9 @@ class XQueryProgramReader final : public XQueryPartVisitor {
   }
 
   XQueryProgram& _program;
-  std::vector<Waiting> _waiting;          // the next one last
-  std::vector<Waiting> _parts;            // of the place just opened, in order
-  std::vector<XQueryPlaceID> _binders{};  // by ID of the variable
+  XQueryPlanList<Waiting> _waiting;          // the next one last
+  XQueryPlanList<Waiting> _parts;            // of the place just opened, in order
+  XQueryPlanList<XQueryPlaceID> _binders{};  // by ID of the variable
   XQueryPlaceID _whole = XQueryNoPlace;
   const XQueryStep* _step = nullptr;
   bool _bodyIsOrdered = true;

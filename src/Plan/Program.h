@@ -29,6 +29,11 @@ class XQueryProlog;
 class XQueryStep;
 class XQueryVarDecl;
 
+// What is noted of a program is many times as long as its text, so that it counts as memory of an
+// evaluation that compiles one.
+template <class T>
+using XQueryPlanList = std::vector<T, ValueAllocator<T>>;
+
 using XQueryPlaceID = uint32_t;
 inline constexpr XQueryPlaceID XQueryNoPlace = UINT32_MAX;
 
@@ -70,9 +75,9 @@ class XQueryProgram {
   const XQueryPlace& operator[](XQueryPlaceID place) const { return _places[place]; }
   // Every place once, parts before their whole and, of the parts of a whole, in the order in which
   // they are bound: a clause before what its variable is used in.
-  const std::vector<XQueryPlaceID>& partsFirst() const { return _partsFirst; }
+  const XQueryPlanList<XQueryPlaceID>& partsFirst() const { return _partsFirst; }
   // The body of the query, if any, is the last.
-  const std::vector<XQueryProgramBody>& bodies() const { return _bodies; }
+  const XQueryPlanList<XQueryProgramBody>& bodies() const { return _bodies; }
   // The body that a place is in.
   const XQueryProgramBody& bodyOf(XQueryPlaceID place) const;
 
@@ -107,11 +112,11 @@ class XQueryProgram {
   void addModules(const XQueryProlog& main);
   friend class XQueryProgramReader;
 
-  std::vector<Ref<XQueryExpr>> _replaced;
   std::vector<Ref<NSCounted>> _replacedSteps;
-  std::vector<XQueryProgramBody> _bodies;
-  std::vector<XQueryPlace> _places;
-  std::vector<XQueryPlaceID> _partsFirst;
+  XQueryPlanList<Ref<XQueryExpr>> _replaced;
+  XQueryPlanList<XQueryProgramBody> _bodies;
+  XQueryPlanList<XQueryPlace> _places;
+  XQueryPlanList<XQueryPlaceID> _partsFirst;
 };
 
 }  // namespace xquery

@@ -3,6 +3,7 @@
 #include "Expr/XQueryLists.h"
 #include "Plan/Plan.h"
 #include "Plan/PlanTesting.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <map>
 #include <set>
@@ -163,6 +164,24 @@ TEST(Program, HoldsTheBodiesOfFunctionsAndGlobals) {
             "operator(Operand variable, Operand literal)");
   EXPECT_EQ(&program.bodyOf(program.bodies()[2].place + 1), &program.bodies()[2]);
   EXPECT_EQ(&program.bodyOf(program.bodies()[1].place), &program.bodies()[1]);
+}
+
+TEST(Program, CountsAsMemoryWithWhatIsKnownOfItsPlaces) {
+  std::string text;
+  for (int i = 0; i < 1000; ++i) {
+    text += "declare function local:f" + std::to_string(i) + "() { 1 + 2 };\n";
+  }
+  const auto query = compiled(text + "1");
+  const int64_t before = workMeter.valueBytes;
+  {
+    const XQueryProgram program = programOf(*query);
+    const size_t ofProgram = static_cast<size_t>(workMeter.valueBytes - before);
+    EXPECT_GE(ofProgram, program.placeCount() * sizeof(XQueryPlace));
+    const XQueryFactTable facts(program);
+    const size_t ofAll = static_cast<size_t>(workMeter.valueBytes - before);
+    EXPECT_GE(ofAll - ofProgram, (program.placeCount() + 1000) * sizeof(XQueryFacts));
+  }
+  EXPECT_EQ(workMeter.valueBytes, before);
 }
 
 XQueryPlaceID onlyOf(const XQueryProgram& program, Kind kind, int which = 0) {
