@@ -28,6 +28,7 @@
 #include <cstdint>
 #include <cstdlib>
 #include <exception>
+#include <malloc.h>
 #include <memory>
 #include <mutex>
 #include <new>
@@ -139,7 +140,9 @@ class Allocator {
       leave(tooMuchTime);
     }
   }
+  // Most blocks are so small that what malloc and we add is a good part of them.
   void link(Block* block) {
+    block->size = malloc_usable_size(block) + sizeof(size_t);
     block->previous = nullptr;
     block->next = _blocks;
     if (_blocks) _blocks->previous = block;
@@ -186,7 +189,6 @@ void* Allocator::allocate(TidyAllocator* self, size_t size) {
   allocator.check(size);
   auto* const block = static_cast<Block*>(std::malloc(headSize + size));
   if (!block) allocator.leave("out of memory");
-  block->size = size;
   allocator.link(block);
   return block->bytes;
 }
@@ -202,7 +204,6 @@ void* Allocator::reallocate(TidyAllocator* self, void* bytes, size_t size) {
     allocator.link(block);
     allocator.leave("out of memory");
   }
-  moved->size = size;
   allocator.link(moved);
   return moved->bytes;
 }
@@ -594,6 +595,7 @@ std::optional<std::string> XHTMLFromHTML(std::string_view bytes, std::string& fa
     failure = "HTML with a tag of too many attributes";
     return std::nullopt;
   }
+  const CountedBytes counted(HTML.capacity());
   return std::make_shared<Conversion>(std::move(HTML))->XHTML(failure);
 }
 
