@@ -38,12 +38,13 @@ struct XQueryLimits {
   std::shared_ptr<std::atomic<bool>> cancelled;
   // Bytes that the values made by one evaluation may take at a time: "limit: memory ceiling
   // reached". Counted are atomic values and their texts and digits, sequences, constructed nodes,
-  // documents read while evaluating, texts being put together, frames of variables, and all that a
+  // documents read while evaluating with their names, texts being put together, frames of
+  // variables, what is noted of a query that is compiled while evaluating, and all that a
   // stylesheet works on; what is freed again no longer counts. Not counted are what exists before
-  // the evaluation begins, the stack, tables of names, and lists that are kept only while a path, a
-  // comparison or a sort is worked out, which are in proportion to what they work on. A block of 64
-  // KiB or more that would exceed the ceiling is not made; smaller ones, and what a stylesheet asks
-  // for, may exceed it by some megabytes before it is noticed.
+  // the evaluation begins, the stack, names of nodes that stand alone, and lists that are kept only
+  // while a path, a comparison or a sort is worked out, which are in proportion to what they work
+  // on. A block of 64 KiB or more that would exceed the ceiling is not made; smaller ones, and what
+  // a stylesheet asks for, may exceed it by some megabytes before it is noticed.
   std::optional<uint64_t> memoryCeiling;
 };
 
