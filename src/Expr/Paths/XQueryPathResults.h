@@ -59,9 +59,10 @@ class XQueryPathResults {
   uint64_t _most = UINT64_MAX;
   uint64_t _count = 0;
   bool _countsOnly = false;
-  std::vector<NSXMLNode*> _counted;  // in place of the items, where they are counted only
-  Value _firstResult;                // the only item
-  Ref<NSArray> _array;               // two or more items
+  // In place of the items, where they are counted only.
+  std::vector<NSXMLNode*, ValueAllocator<NSXMLNode*>> _counted;
+  Value _firstResult;   // the only item
+  Ref<NSArray> _array;  // two or more items
   NSObject* _lastStored = nullptr;
   XQueryIdentitySet _unique;  // in use while the arrival is mixed
   Arrival _arrival = Arrival::AnyOrder;
