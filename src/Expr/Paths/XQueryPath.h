@@ -35,7 +35,7 @@ enum XQueryAxis : int {
   XQueryAxisPrecedingSibling = 11,
   XQueryAxisAncestorOrSelf = 12,
   // No axis of a query: the attributes of a node and of all below it, as "//@a" finds them.
-  XQueryAxisAttributesBelow = 13,
+  XQueryAxisAttributesBelow = 1000,
 };
 
 class XQueryStep : public NSCounted {
