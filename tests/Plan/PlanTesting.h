@@ -15,6 +15,7 @@
 #include <array>
 #include <string>
 #include <string_view>
+#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -140,9 +141,10 @@ inline std::string shownItem(const NSObject& item) {
 }
 
 inline Outcome outcomeOf(const XQuery& query, const Value& contextItem,
-                         const XQueryConstants& constants = {}) {
+                         const XQueryConstants& constants = {}, const XQueryLimits& limits = {}) {
   Outcome outcome;
   const auto context = XQueryContext::xqueryContext();
+  context->contextSetLimits(limits);
   Ref<XQueryError> error;
   const auto items = context->evaluateXQuery(query, constants, contextItem, &error);
   if (error) {
@@ -151,13 +153,12 @@ inline Outcome outcomeOf(const XQuery& query, const Value& contextItem,
                             (error->msg() ? error->msg()->utf8() : ""));
   }
   if (items) {
-    std::vector<const NSObject*> seen;
+    std::unordered_map<const NSObject*, size_t> places;
     for (const Value& item : items->objects()) {
-      const auto same = std::find(seen.begin(), seen.end(), item.get());
+      const auto [first, isNew] = places.try_emplace(item.get(), outcome.lines.size());
       std::string line = shownItem(*item);
-      if (same != seen.end()) line += " as " + std::to_string(same - seen.begin());
+      if (!isNew) line += " as " + std::to_string(first->second);
       outcome.lines.push_back(std::move(line));
-      seen.push_back(item.get());
     }
   }
   const auto& left = context->_internal();
