@@ -168,6 +168,10 @@ class ProgramGenerator {
     if (text == "." && _random.below(2)) text = "(" + expr(depth - 1) + ")";
     const size_t steps = 1 + _random.below(3);
     for (size_t i = 0; i < steps; ++i) text += step(depth);
+    if (_random.below(8) == 0) {
+      text += _random.oneOf({"/position()", "/last()", "/string(position())", "/data(.)", "/(., 1)",
+                             "/concat(position(), last())"});
+    }
     if (_random.below(8) == 0) text += "/(" + expr(depth - 1) + ")";
     return text;
   }

@@ -4,8 +4,8 @@
 //             where that is the first predicate of the step; P/(a | b), P//(a | b), P/(@a | @b);
 //             //a | //b, /r/a | /r/b
 // Facts       the test before the filter looks at kinds of nodes alone; the names can be resolved
-//             without an error; nothing behind "(a | b)" asks for the position that a node has
-//             among those of the other names
+//             without an error; no expression behind it asks for the position that a node has
+//             among the others; nothing shows the focus that it leaves (StepsAround.h)
 // Operator    none: the step takes the choice of names into its test (XQueryAxisStep::setChoice),
 // so
 //             that it is found in the index of the tree, below "//" as well
@@ -19,6 +19,7 @@
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 #include "Plan/Rules/NameConditions.h"
+#include "Plan/Rules/StepsAround.h"
 
 #include <memory>
 #include <vector>
@@ -154,7 +155,7 @@ class Search {
     XQueryStep* previous = nullptr;
     for (XQueryStep* step = path.step(); step; previous = step, step = step->next()) {
       if (auto* axisStep = dyn_cast<XQueryAxisStep>(step)) {
-        hasChanged = takeFilter(place, *axisStep) || hasChanged;
+        hasChanged = takeFilter(place, path, *axisStep) || hasChanged;
       } else if (isa<XQueryAxisStep>(previous) && takeUnion(place, path, *previous, *step)) {
         step = previous->next();
       }
@@ -172,12 +173,15 @@ class Search {
     return part;
   }
 
-  bool takeFilter(XQueryPlaceID path, XQueryAxisStep& step) {
+  bool takeFilter(XQueryPlaceID path, const XQueryPathExpr& expr, XQueryAxisStep& step) {
+    // An expression behind it counts the nodes that are left.
+    if (step.next() && !isa<XQueryAxisStep>(step.next())) return false;
     if (step.choice() || !asksForKindAlone(step.expr()) || step.predicates().empty()) return false;
     const XQueryPlaceID place = partOf(path, step, XQueryRole::Predicate);
     if (place == XQueryNoPlace || !_planning.isOpen(place)) return false;
     XQueryNameChoice names = namesAskedFor(*_planning.program[place].expr);
     if (names.isEmpty()) return false;
+    if (!XQueryHidesFocusOf(step, expr, path, _planning)) return refuse(place);
     step.setChoice(std::make_unique<const XQueryNameChoice>(std::move(names)), 1);
     _planning.leaveOut(place);
     _planning.choose(place, "it is part of the test of the step");
@@ -199,6 +203,7 @@ class Search {
       return axis == XQueryAxisChild || axis == XQueryAxisAttribute;
     };
     if (!forEachOperand(_planning.program[place].expr, isUnion, add)) return false;
+    if (!XQueryHidesFocusOf(step, expr, path, _planning)) return refuse(place);
     auto by =
         XQueryAxisStep::axisStepWithAxis(axis, XQueryWildCardNameTest::nameTest(nullptr, nullptr));
     by->setChoice(std::move(names), 0);
@@ -206,6 +211,11 @@ class Search {
     _planning.choose(place, "one step with several names");
     _planning.program.keep(expr.replaceStepBehind(previous, by));
     return true;
+  }
+
+  bool refuse(XQueryPlaceID place) {
+    _planning.refuse(place, "an error that comes up later may show the focus that it leaves");
+    return false;
   }
 
   // The first path takes the names of the others.
