@@ -102,23 +102,40 @@ class XQueryKeptExpr::Assignments {
   std::vector<Variable> _variables;
 };
 
+// The focus as it is.
+struct XQueryKeptExpr::Focus {
+  explicit Focus(const XQueryContextInternal& context)
+      : item(context.contextItem()), position(context.position()), last(context.last()) {}
+
+  Value item;
+  int64_t position;
+  int64_t last;
+};
+
 class XQueryKeptExpr::Outcome final : public XQueryKeptValue {
  public:
   // Of an evaluation that has just been done.
-  Outcome(Value value, Assignments assignments, const XQueryContextInternal& context)
+  Outcome(Value value, Assignments assignments, const Focus& before,
+          const XQueryContextInternal& context)
       : _value(std::move(value)), _assignments(std::move(assignments)) {
     if (_value || !context.isFailing()) return;
     _error = context.error();
-    _item = context.contextItem();
-    _position = context.position();
-    _last = context.last();
+    // A part of the focus that the evaluation has not set is, the next time, what it is then.
+    const Focus left(context);
+    if (left.item != before.item || left.position != before.position) {
+      _item = left.item;
+      _position = left.position;
+      _setsItem = true;
+    }
+    _last = left.last;
+    _setsLast = left.last != before.last;
   }
 
   Value replay(XQueryContextInternal& context) const {
     _assignments.replay(context);
     if (!_error) return _value;
-    context.setContextItem(_item, _position);
-    context.setLast(_last);
+    if (_setsItem) context.setContextItem(_item, _position);
+    if (_setsLast) context.setLast(_last);
     return context.fail(_error);
   }
 
@@ -126,6 +143,8 @@ class XQueryKeptExpr::Outcome final : public XQueryKeptValue {
   Value _value;
   Assignments _assignments;
   Ref<XQueryError> _error;  // null unless the evaluation failed
+  bool _setsItem = false;
+  bool _setsLast = false;
   Value _item;
   int64_t _position = 0;
   int64_t _last = 0;
@@ -167,10 +186,11 @@ Value XQueryKeptExpr::computeValue(XQueryContext& context) const {
   }
   if (use != XQueryKeptValues::Use::Second) return plain().evaluateWithContext(context);
   Assignments assignments(_facts, dynamic);
+  const Focus before(dynamic);
   Value value = plain().evaluateWithContext(context);
   const bool isKnown = assignments.finish() && !dynamic.isFailingForGood();
   std::shared_ptr<Outcome> outcome;
-  if (isKnown) outcome = std::make_shared<Outcome>(value, std::move(assignments), dynamic);
+  if (isKnown) outcome = std::make_shared<Outcome>(value, std::move(assignments), before, dynamic);
   keptValues.keep(*this, dependencies.values(), std::move(outcome));
   return value;
 }

@@ -33,6 +33,7 @@ class XQueryKeptExpr : public XQueryPlannedExpr {
  private:
   class Dependencies;
   class Assignments;
+  struct Focus;
   class Outcome;
 
   const XQueryFacts _facts;
