@@ -162,6 +162,15 @@ XQueryRelation XQueryRelationForCode(int valueComparisonCode) {
   return relations[static_cast<size_t>(valueComparisonCode - XQueryOperatorEq)];
 }
 
+XQueryRelation XQueryMirrored(XQueryRelation relation) {
+  if (relation.test == XQueryRelation::Less) {
+    relation.test = XQueryRelation::Greater;
+  } else if (relation.test == XQueryRelation::Greater) {
+    relation.test = XQueryRelation::Less;
+  }
+  return relation;
+}
+
 Value XQueryOperatorExpr::compareValue(const Value& a, const Value& withValue, int forType,
                                        XQueryContext& withContext) {
   const Value& b = withValue;

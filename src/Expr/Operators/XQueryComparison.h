@@ -24,6 +24,8 @@ struct XQueryRelation {
 };
 // For a value comparison code, 19 to 24.
 XQueryRelation XQueryRelationForCode(int valueComparisonCode);
+// The relation with its sides exchanged: a < b is b > a, and not (a < b) is not (b > a).
+XQueryRelation XQueryMirrored(XQueryRelation relation);
 
 // The types to which a pair is cast before a general comparison; 0 leaves an item as it is.
 struct XQueryPairTargets {

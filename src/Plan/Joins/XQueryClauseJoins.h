@@ -18,16 +18,29 @@ class XQueryClauseJoins {
   // which it may hold, or for which it may not hold.
   enum class Picks : uint8_t { WhereItHolds, WhereItFails };
 
-  // The places of the clauses, and of the condition.
-  XQueryClauseJoins(XQueryPlanning& planning, std::vector<XQueryPlaceID> clauses,
-                    XQueryPlaceID condition, Picks picks)
-      : _planning(planning), _clauses(std::move(clauses)), _condition(condition), _picks(picks) {}
+  // The condition, a part of the expression, stands behind the clauses.
+  XQueryClauseJoins(XQueryPlanning& planning, XQueryPlaceID expr, XQueryPlaceID condition,
+                    Picks picks)
+      : _planning(planning),
+        _clauses(partsBefore(condition, expr, planning.program)),
+        _condition(condition),
+        _picks(picks) {}
 
   void join() {
     for (size_t index = 0; index < _clauses.size(); ++index) joinClause(index);
   }
 
  private:
+  static std::vector<XQueryPlaceID> partsBefore(XQueryPlaceID end, XQueryPlaceID whole,
+                                                const XQueryProgram& program) {
+    std::vector<XQueryPlaceID> parts;
+    for (XQueryPlaceID part = program.firstPart(whole); part != end;
+         part = program.nextPart(part)) {
+      parts.push_back(part);
+    }
+    return parts;
+  }
+
   const XQueryPlace& at(XQueryPlaceID place) const { return _planning.program[place]; }
   const XQueryFacts& facts(XQueryPlaceID place) const { return _planning.facts[place]; }
   const XQueryBindingExpr& clauseAt(size_t index) const {

@@ -109,15 +109,6 @@ void arrange(XQueryJoinTable::Selection& selection) {
 
 }  // namespace
 
-XQueryRelation XQueryMirrored(XQueryRelation relation) {
-  if (relation.test == XQueryRelation::Less) {
-    relation.test = XQueryRelation::Greater;
-  } else if (relation.test == XQueryRelation::Greater) {
-    relation.test = XQueryRelation::Less;
-  }
-  return relation;
-}
-
 // --- operands ------------------------------------------------------------------------------------
 
 XQueryJoinTable::Operand::Operand(NSObject* item) {

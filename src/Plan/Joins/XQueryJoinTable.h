@@ -45,9 +45,6 @@ struct XQueryJoinRelation {
   bool isComplement = false;
 };
 
-// a < b is b > a, and not (a < b) is not (b > a).
-XQueryRelation XQueryMirrored(XQueryRelation relation);
-
 class XQueryJoinTable final : public XQueryKeptValue {
  public:
   using Selection = std::vector<XQueryPick>;

@@ -65,22 +65,12 @@ class Comparison {
     if (isValueComparison && !constant->text) return nullptr;
     const int code = isValueComparison ? type : type + XQueryOperatorEq - XQueryOperatorEqual;
     XQueryRelation relation = XQueryRelationForCode(code);
-    if (isMirrored) relation = mirrored(relation);
+    if (isMirrored) relation = XQueryMirrored(relation);
     return XQueryConstantComparison::exprWithPlain(plain, walk, relation, isValueComparison,
                                                    *std::move(constant));
   }
 
  private:
-  // a < b is b > a, and not (a < b) is not (b > a).
-  static XQueryRelation mirrored(XQueryRelation relation) {
-    if (relation.test == XQueryRelation::Less) {
-      relation.test = XQueryRelation::Greater;
-    } else if (relation.test == XQueryRelation::Greater) {
-      relation.test = XQueryRelation::Less;
-    }
-    return relation;
-  }
-
   const XQueryOperatorExpr& _expr;
 };
 

@@ -18,9 +18,6 @@
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 
-#include <utility>
-#include <vector>
-
 namespace xquery {
 
 void XQueryJoinForClauses(XQueryPlanning& planning) {
@@ -29,13 +26,8 @@ void XQueryJoinForClauses(XQueryPlanning& planning) {
     if (program[place].expr->kind() != Kind::FLWORExpr) continue;
     const XQueryPlaceID where = program.part(place, XQueryRole::Where);
     if (where == XQueryNoPlace) continue;
-    std::vector<XQueryPlaceID> clauses;
-    for (XQueryPlaceID part = program.firstPart(place); part != where;
-         part = program.nextPart(part)) {
-      clauses.push_back(part);
-    }
     using Picks = XQueryClauseJoins::Picks;
-    XQueryClauseJoins(planning, std::move(clauses), where, Picks::WhereItHolds).join();
+    XQueryClauseJoins(planning, place, where, Picks::WhereItHolds).join();
   }
 }
 

@@ -15,9 +15,6 @@
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 
-#include <utility>
-#include <vector>
-
 namespace xquery {
 
 void XQueryJoinQuantifiers(XQueryPlanning& planning) {
@@ -27,14 +24,9 @@ void XQueryJoinQuantifiers(XQueryPlanning& planning) {
     if (!quantifier) continue;
     const XQueryPlaceID satisfies = program.part(place, XQueryRole::Satisfies);
     if (satisfies == XQueryNoPlace) continue;
-    std::vector<XQueryPlaceID> clauses;
-    for (XQueryPlaceID part = program.firstPart(place); part != satisfies;
-         part = program.nextPart(part)) {
-      clauses.push_back(part);
-    }
     using Picks = XQueryClauseJoins::Picks;
     const Picks picks = quantifier->every() ? Picks::WhereItFails : Picks::WhereItHolds;
-    XQueryClauseJoins(planning, std::move(clauses), satisfies, picks).join();
+    XQueryClauseJoins(planning, place, satisfies, picks).join();
   }
 }
 

@@ -6,9 +6,8 @@
 // Facts       the test before the filter looks at kinds of nodes alone; the names can be resolved
 //             without an error; no expression behind it asks for the position that a node has
 //             among the others; nothing shows the focus that it leaves (StepsAround.h)
-// Operator    none: the step takes the choice of names into its test (XQueryAxisStep::setChoice),
-// so
-//             that it is found in the index of the tree, below "//" as well
+// Operator    none: the step takes the choice of names into its test (XQueryAxisStep::setChoice)
+//             and so it is found in the index of the tree, below "//" as well
 // Why         all of these conditions look at the node alone and cannot fail; the children of a
 //             node that have one of two names are, in document order, the union of those that have
 //             the one and those that have the other; so are the results of whole paths from the
