@@ -1,7 +1,7 @@
 #include "Functions/Aggregate.h"
 
 #include "Expr/Operators/XQueryArithmetic.h"
-#include "Expr/Operators/XQueryNumericOperand.h"
+#include "Types/XQueryNumericOperand.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryTextArgument.h"

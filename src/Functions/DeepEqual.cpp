@@ -5,7 +5,6 @@
 #include "Functions/DeepEqual.h"
 
 #include "Context/XQueryContextInternal.h"
-#include "Expr/Operators/XQueryComparison.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
@@ -21,9 +20,6 @@ bool sameItems(NSObject* a, NSObject* b, XQueryContext& context) {
   if (a->isNode() || b->isNode()) {
     return a->isNode() && b->isNode() &&
            XQueryNodeEqual(cast<NSXMLNode>(a), cast<NSXMLNode>(b), &context);
-  }
-  if (Value answer = XQueryValueComparisonShortcut(XQueryOperatorEq, a, b)) {
-    return XQueryIsTrue(answer);
   }
   return XQueryIsTrue(
       XQueryOperatorExpr::evaluateOperator(XQueryOperatorEq, Value(a), Value(b), context));

@@ -5,7 +5,7 @@
 // since their promotion cannot fail; everything else is promoted as the rule says.
 #pragma once
 
-#include "Expr/Operators/XQueryUntypedText.h"
+#include "Types/XQueryUntypedText.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"

@@ -28,6 +28,8 @@ constexpr std::array rules = {
                XQueryCompareConstants},
     XQueryRule{"short paths", "what a few steps find from one node is taken as it comes",
                XQueryShortenPaths},
+    XQueryRule{"operands", "arithmetic and comparisons of numbers and texts make no values between",
+               XQueryAnswerQuickly},
     // Behind what replaces keys and probes, which joins evaluate.
     XQueryRule{"for-joins", "the where clause picks items of the for clauses by their keys",
                XQueryJoinForClauses},

@@ -36,5 +36,6 @@ void XQueryTakeFirst(XQueryPlanning& planning);
 void XQueryAskMembers(XQueryPlanning& planning);
 void XQueryCompareConstants(XQueryPlanning& planning);
 void XQueryShortenPaths(XQueryPlanning& planning);
+void XQueryAnswerQuickly(XQueryPlanning& planning);
 
 }  // namespace xquery

@@ -2,7 +2,6 @@
 
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/Base/LastingObjects.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryDateArithmetic.h"
@@ -350,35 +349,29 @@ bool dividesByZero(int type, const Value& left, const Value& right) {
 
 }  // namespace
 
-Value XQueryArithmeticPlainly(int type, const Value& left, const Value& right,
-                              XQueryContext& context) {
-  Value a = normalised(left);
+Value XQueryOperatorExpr::arithmeticOperatorEvaluate(int type, const Value& withLeft,
+                                                     const Value& right,
+                                                     XQueryContext& forContext) {
+  Value a = normalised(withLeft);
   Value b = normalised(right);
   if (!a || !b) return Value();
   if (isNull(a) || isNull(b)) return NSNull::null();
   if (isa<NSArray>(a) || isa<NSArray>(b)) return Value();
   const XQueryTypeID untypedAs = type == XQueryOperatorIDiv ? XQueryTypeInteger : XQueryTypeDouble;
-  a = asNumberIfUntyped(a, untypedAs, context);
-  b = asNumberIfUntyped(b, untypedAs, context);
+  a = asNumberIfUntyped(a, untypedAs, forContext);
+  b = asNumberIfUntyped(b, untypedAs, forContext);
   if (dividesByZero(type, a, b)) return XQueryErrors::divideByZero.error();
   const XQueryTypeID leftType = XQueryObjectTypeID(a.get());
   const XQueryTypeID rightType = XQueryObjectTypeID(b.get());
   for (const Row& row : rows) {
     if (row.type == type && row.left(leftType) && row.right(rightType)) {
-      return row.work(a, b, context);
+      return row.work(a, b, forContext);
     }
   }
   return Value();
 }
 
-Value XQueryOperatorExpr::arithmeticOperatorEvaluate(int type, const Value& withLeft,
-                                                     const Value& right,
-                                                     XQueryContext& forContext) {
-  if (Value answer = XQueryArithmeticShortcut(type, withLeft.get(), right.get())) return answer;
-  return XQueryArithmeticPlainly(type, withLeft, right, forContext);
-}
-
-Value XQueryUnarySignPlainly(int type, const Value& operand, XQueryContext& context) {
+Value XQueryUnarySign(int type, const Value& operand, XQueryContext& context) {
   Value number = normalised(operand);
   if (!number) return Value();
   if (isNull(number)) return NSNull::null();
@@ -390,18 +383,6 @@ Value XQueryUnarySignPlainly(int type, const Value& operand, XQueryContext& cont
   // The zero is not asked to be of the type: some derived integer types have none.
   const Value result = compute(work, *XQueryNumber::zero(), numberIn(number), numberType);
   return XQueryCastAsTypeForContext(result, numberType, context);
-}
-
-Value XQueryUnarySign(int type, const Value& operand, XQueryContext& context) {
-  // Where the shortcut applies, adding to an integer leaves every operand in its own type.
-  static const Ref<XQueryNumber> zero = [] {
-    const LastingObjects lasting;
-    Ref<XQueryNumber> integer = XQueryNumber::integerWithInt64(0);
-    integer->makeImmortal();
-    return integer;
-  }();
-  if (Value answer = XQueryArithmeticShortcut(type, zero.get(), operand.get())) return answer;
-  return XQueryUnarySignPlainly(type, operand, context);
 }
 
 }  // namespace xquery

@@ -42,12 +42,4 @@ float XQueryQuotient(float a, float b);
 // double, a node is atomized, the empty sequence stays empty; null for anything else but a number.
 Value XQueryUnarySign(int type, const Value& operand, XQueryContext& context);
 
-// The operators without shortcuts: what they answer is the definition.
-Value XQueryArithmeticPlainly(int type, const Value& left, const Value& right,
-                              XQueryContext& context);
-Value XQueryUnarySignPlainly(int type, const Value& operand, XQueryContext& context);
-// The same answers for the commonest operands without casts, and with one allocation at most for
-// the result; null when it does not apply or the plain algorithm would fail.
-Value XQueryArithmeticShortcut(int type, const NSObject* left, const NSObject* right);
-
 }  // namespace xquery

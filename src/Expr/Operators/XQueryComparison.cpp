@@ -2,7 +2,6 @@
 
 #include "Expr/Operators/XQueryArithmetic.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
-#include "Expr/Operators/XQueryUntypedText.h"
 #include "Expr/Paths/NodeOrder.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
@@ -203,69 +202,17 @@ Value untypedAsString(Value atomic, XQueryContext& context) {
   return XQueryCastAsTypeForContext(atomic, XQueryTypeString, context);
 }
 
-bool hasText(const NSObject* operand) {
-  return XQueryIsUntyped(operand) || isa<XQueryString>(operand);
-}
-
-// Exactly xs:integer, in a machine word.
-const NSDecimal* smallInteger(const XQueryNumber& number) {
-  if (number.typeID() != XQueryTypeInteger) return nullptr;
-  const NSDecimal* decimal = number.storedDecimal();
-  return decimal && decimal->isSmallInteger() ? decimal : nullptr;
-}
-
-// Null unless both operands are typed numbers (which the durations are not). Numbers are compared
-// by their order, no relation holding for NaN; comparing integers in a word is that for them.
-Value numberShortcut(XQueryRelation relation, const NSObject* left, const NSObject* right) {
-  const auto* a = dyn_cast<XQueryNumber>(left);
-  const auto* b = a ? dyn_cast<XQueryNumber>(right) : nullptr;
-  if (!b) return Value();
-  const NSDecimal* x = smallInteger(*a);
-  const NSDecimal* y = x ? smallInteger(*b) : nullptr;
-  if (y) {
-    const int64_t first = x->smallInteger();
-    const int64_t second = y->smallInteger();
-    return truth(relation.holds(first < second ? -1 : first > second ? 1 : 0));
-  }
-  if (!XQueryIsNumericTypeID(a->typeID()) || !XQueryIsNumericTypeID(b->typeID())) return Value();
-  if (eitherIsNaN(*a, *b)) return truth(false);
-  return truth(relation.holds(a->compare(*b)));
-}
-
 }  // namespace
-
-Value XQueryValueComparisonPlainly(int type, const Value& left, const Value& right,
-                                   XQueryContext& context) {
-  Value a = XQueryAtomizationCheckingOccurrence(left, XQueryOccurrenceAnyAlso, context);
-  Value b = XQueryAtomizationCheckingOccurrence(right, XQueryOccurrenceAnyAlso, context);
-  if (isNull(a) || isNull(b)) return NSNull::null();
-  a = untypedAsString(std::move(a), context);
-  b = untypedAsString(std::move(b), context);
-  return XQueryOperatorExpr::compareValue(a, b, type, context);
-}
-
-Value XQueryValueComparisonShortcut(int type, const NSObject* left, const NSObject* right) {
-  if (type < XQueryOperatorEq || type > XQueryOperatorGe) return Value();
-  const XQueryRelation relation = XQueryRelationForCode(type);
-  // An untyped operand is compared as a string, and so is every string type.
-  if (hasText(left) && hasText(right)) {
-    const XQueryUntypedText a(*left);
-    const XQueryUntypedText b(*right);
-    if (relation.test == Test::Equal) {
-      return truth(a.view().equals(b.view()) != relation.negated);
-    }
-    return truth(relation.holds(a.view().compare(b.view())));
-  }
-  return numberShortcut(relation, left, right);
-}
 
 Value XQueryOperatorExpr::valueComparisonOperatorEvaluate(int type, const Value& withLeft,
                                                           const Value& right,
                                                           XQueryContext& forContext) {
-  if (Value answer = XQueryValueComparisonShortcut(type, withLeft.get(), right.get())) {
-    return answer;
-  }
-  return XQueryValueComparisonPlainly(type, withLeft, right, forContext);
+  Value a = XQueryAtomizationCheckingOccurrence(withLeft, XQueryOccurrenceAnyAlso, forContext);
+  Value b = XQueryAtomizationCheckingOccurrence(right, XQueryOccurrenceAnyAlso, forContext);
+  if (isNull(a) || isNull(b)) return NSNull::null();
+  a = untypedAsString(std::move(a), forContext);
+  b = untypedAsString(std::move(b), forContext);
+  return compareValue(a, b, type, forContext);
 }
 
 // --- general comparisons -------------------------------------------------------------------------
@@ -291,10 +238,11 @@ Value castTo(NSObject* item, XQueryTypeID target, XQueryContext& context) {
 
 }  // namespace
 
-Value XQueryGeneralComparisonPlainly(int type, const Value& left, const Value& right,
-                                     XQueryContext& context) {
-  const Value a = XQueryAtomization(left, context);
-  const Value b = XQueryAtomization(right, context);
+Value XQueryOperatorExpr::generalComparisonOperatorEvaluate(int type, const Value& withLeft,
+                                                            const Value& right,
+                                                            XQueryContext& forContext) {
+  const Value a = XQueryAtomization(withLeft, forContext);
+  const Value b = XQueryAtomization(right, forContext);
   if (isNull(a) || isNull(b)) return NSNull::null();
   const XQueryItemList leftItems(a.get());
   const XQueryItemList rightItems(b.get());
@@ -304,28 +252,13 @@ Value XQueryGeneralComparisonPlainly(int type, const Value& left, const Value& r
       checkWork();
       const XQueryPairTargets targets = XQueryGeneralComparisonTargets(
           XQueryObjectTypeID(leftItems[i]), XQueryObjectTypeID(rightItems[j]));
-      const Value x = castTo(leftItems[i], targets.left, context);
-      const Value y = castTo(rightItems[j], targets.right, context);
-      Value answer = XQueryOperatorExpr::compareValue(x, y, code, context);
+      const Value x = castTo(leftItems[i], targets.left, forContext);
+      const Value y = castTo(rightItems[j], targets.right, forContext);
+      Value answer = compareValue(x, y, code, forContext);
       if (!(answer.get() == NSNumber::falseValue())) return answer;
     }
   }
   return truth(false);
-}
-
-Value XQueryOperatorExpr::generalComparisonOperatorEvaluate(int type, const Value& withLeft,
-                                                            const Value& right,
-                                                            XQueryContext& forContext) {
-  // Most comparisons are of two single numbers, which need no conversion.
-  if (type >= XQueryOperatorEqual && type <= XQueryOperatorGreaterEqual) {
-    const int code = type + (XQueryOperatorEq - XQueryOperatorEqual);
-    Value answer = numberShortcut(XQueryRelationForCode(code), withLeft.get(), right.get());
-    if (answer) return answer;
-  }
-  if (Value answer = XQueryGeneralComparisonShortcut(type, withLeft, right, forContext)) {
-    return answer;
-  }
-  return XQueryGeneralComparisonPlainly(type, withLeft, right, forContext);
 }
 
 // --- node comparisons ----------------------------------------------------------------------------

@@ -34,17 +34,4 @@ struct XQueryPairTargets {
 };
 XQueryPairTargets XQueryGeneralComparisonTargets(XQueryTypeID left, XQueryTypeID right);
 
-// The comparison operators without shortcuts: what they answer is the definition.
-Value XQueryValueComparisonPlainly(int type, const Value& left, const Value& right,
-                                   XQueryContext& context);
-Value XQueryGeneralComparisonPlainly(int type, const Value& left, const Value& right,
-                                     XQueryContext& context);
-
-// The same answers for the commonest operands; null when the shortcut does not apply.
-Value XQueryValueComparisonShortcut(int type, const NSObject* left, const NSObject* right);
-Value XQueryGeneralComparisonShortcut(int type, const Value& left, const Value& right,
-                                      XQueryContext& context);
-// A general comparison with all the integers from `first` to `last`, which are not made for it.
-Value XQueryGeneralComparisonWithRange(int type, const Value& left, int64_t first, int64_t last);
-
 }  // namespace xquery

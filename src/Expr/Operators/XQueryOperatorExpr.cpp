@@ -209,6 +209,9 @@ Value XQueryOperatorExpr::evaluateWithLeftValue(const Value& left, XQueryContext
 
 Value XQueryOperatorExpr::answerFor(const Value& left, const Value& right,
                                     XQueryContext& context) const {
+  if (_quickly) {
+    if (Value answer = _quickly(_type, left, right, context)) return answer;
+  }
   Value answer = isSign() ? XQueryUnarySign(_type, right, context)
                           : dispatch(_type, leftOrEmpty(left), right, context);
   if (isFailure(answer)) return context._internal().fail(errorFor(answer, _line));

@@ -1,9 +1,7 @@
 // Binary operators, and the unary signs.
 //
 // The class methods work on values that are evaluated already; functions that add, divide or
-// compare call them as well. They take the operator code, the left and the right value. Where an
-// operator has a shortcut for common operands, the plain algorithm that defines the answer stays
-// callable beside it (XQueryArithmetic.h, XQueryComparison.h).
+// compare call them as well. They take the operator code, the left and the right value.
 #pragma once
 
 #include "Expr/XQueryExpr.h"
@@ -42,6 +40,11 @@ enum XQueryOperatorCode : int {
 
 struct XQueryRangeBounds;
 
+// What the class methods below would answer, told sooner of the operands that it knows; null of all
+// others. A sign has no left operand: null.
+using XQueryQuickAnswer = Value (*)(int type, const Value& left, const Value& right,
+                                    XQueryContext& context);
+
 class XQueryOperatorExpr : public XQueryExpr {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::OperatorExpr; }
@@ -61,6 +64,9 @@ class XQueryOperatorExpr : public XQueryExpr {
   bool isSign() const {
     return !_left && (_type == XQueryOperatorPlus || _type == XQueryOperatorMinus);
   }
+
+  // Asks `quickly` first. Set while a query is planned, before it is evaluated.
+  void answerQuickly(XQueryQuickAnswer quickly) { _quickly = quickly; }
 
   // The range operator that an expression is, in parentheses or not; null for any other
   // expression, which may be null.
@@ -118,6 +124,7 @@ class XQueryOperatorExpr : public XQueryExpr {
   const Value& leftOrEmpty(const Value& left) const;
 
   int _type;
+  XQueryQuickAnswer _quickly = nullptr;
   Ref<XQueryExpr> _left;
   Ref<XQueryExpr> _right;
 };

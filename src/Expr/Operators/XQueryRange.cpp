@@ -1,17 +1,22 @@
 #include "Expr/Operators/XQueryRange.h"
 
 #include "Context/XQueryContextInternal.h"
+#include "Expr/Operators/XQueryComparison.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Types/XQueryAtomization.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
+#include "Types/XQueryNumericOperand.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
 
 #include <algorithm>
+#include <cmath>
 #include <new>
+#include <optional>
 #include <unistd.h>
 #include <vector>
 
@@ -36,6 +41,48 @@ uint64_t mostRangeItems() {
 
 [[noreturn]] void raiseRangeTooLong(XQueryContext& context) {
   context._internal().raise(XQueryErrors::rangeTooLong.error());
+}
+
+// --- comparing with a range ----------------------------------------------------------------------
+
+bool isWhole(int64_t) {
+  return true;
+}
+bool isWhole(double value) {
+  return value == std::trunc(value);
+}
+
+// Whether the relation holds between the value and any integer from `first` to `last`.
+template <class Number>
+bool holdsForRange(XQueryRelation relation, Number value, int64_t first, int64_t last) {
+  const auto low = static_cast<Number>(first);
+  const auto high = static_cast<Number>(last);
+  switch (relation.test) {
+    case XQueryRelation::Equal:
+      if (relation.negated) return first != last || value != low;
+      return value >= low && value <= high && isWhole(value);
+    case XQueryRelation::Less:
+      return relation.negated ? value >= low : value < high;
+    case XQueryRelation::Greater:
+      return relation.negated ? value <= high : value > low;
+  }
+  return false;
+}
+
+bool isComparable(const NSObject* item) {
+  return item && (item->isNode() || XQueryIsAtomicType(item));
+}
+
+// Nothing for what is left to comparing with each of the integers.
+std::optional<bool> holdsForItem(XQueryRelation relation, const NSObject* item, int64_t first,
+                                 int64_t last) {
+  const auto operand = XQueryNumericOperand::of(item);
+  if (operand.form == XQueryNumericOperand::Double) {
+    return !std::isnan(operand.number) && holdsForRange(relation, operand.number, first, last);
+  }
+  const bool isWord = operand.isInteger && operand.exact && operand.exact->isSmallInteger();
+  if (!isWord) return std::nullopt;
+  return holdsForRange(relation, operand.exact->smallInteger(), first, last);
 }
 
 }  // namespace
@@ -87,6 +134,27 @@ Value XQueryRangeIntegers(const XQueryRangeBounds& bounds, XQueryContext& contex
     raiseRangeTooLong(context);
   }
   return sequence;
+}
+
+Value XQueryGeneralComparisonWithRange(int type, const Value& left, int64_t first, int64_t last) {
+  if (first < -XQueryExactIntegerBound || last > XQueryExactIntegerBound) return Value();
+  const XQueryRelation relation =
+      XQueryRelationForCode(type + XQueryOperatorEq - XQueryOperatorEqual);
+  const XQueryItemList items(left.get());
+  if (items.count() == 0) return left ? Value(NSNull::null()) : Value();
+  // An item that cannot be atomized fails before any pair is looked at.
+  WorkPacer pacer;
+  for (size_t i = 0; i < items.count(); ++i) {
+    pacer.turn();
+    if (!isComparable(items[i])) return Value();
+  }
+  for (size_t i = 0; i < items.count(); ++i) {
+    pacer.turn();
+    const std::optional<bool> answer = holdsForItem(relation, items[i], first, last);
+    if (!answer) return Value();
+    if (*answer) return NSNumber::trueValue();
+  }
+  return NSNumber::falseValue();
 }
 
 Value XQueryOperatorExpr::rangeOperatorEvaluate(int, const Value& withLeft, const Value& right,

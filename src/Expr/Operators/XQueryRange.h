@@ -25,4 +25,9 @@ uint64_t XQueryRangeCount(const XQueryRangeBounds& bounds, XQueryContext& contex
 // The integers from bounds that have them. Raises error 0 when they are too many.
 Value XQueryRangeIntegers(const XQueryRangeBounds& bounds, XQueryContext& context);
 
+// A general comparison with all the integers from `first` to `last`, which are not made for it, so
+// that there may be any number of them: an integer, a double or an untyped number is compared with
+// the bounds. Null where that does not tell the answer, which includes each that is an error.
+Value XQueryGeneralComparisonWithRange(int type, const Value& left, int64_t first, int64_t last);
+
 }  // namespace xquery

@@ -15,7 +15,7 @@
 
 #include "Context/KeptValues.h"
 #include "Expr/Operators/XQueryComparison.h"
-#include "Expr/Operators/XQueryUntypedText.h"
+#include "Types/XQueryUntypedText.h"
 #include "Expr/XQueryPicker.h"
 #include "Expr/XQuerySequence.h"
 #include "xquery/Object.h"

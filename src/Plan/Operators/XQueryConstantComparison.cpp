@@ -1,6 +1,6 @@
 #include "Plan/Operators/XQueryConstantComparison.h"
 
-#include "Expr/Operators/XQueryUntypedText.h"
+#include "Types/XQueryUntypedText.h"
 #include "xquery/Number.h"
 
 #include <cmath>

@@ -1,4 +1,4 @@
-#include "Expr/Operators/XQueryUntypedText.h"
+#include "Types/XQueryUntypedText.h"
 
 #include "Platform/Base/WorkMeter.h"
 #include "xquery/XMLNode.h"

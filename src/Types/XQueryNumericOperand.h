@@ -8,7 +8,7 @@
 // and casting them to it is what `asDouble` does, or nothing at all.
 #pragma once
 
-#include "Expr/Operators/XQueryUntypedText.h"
+#include "Types/XQueryUntypedText.h"
 #include "Types/XQueryNumber.h"
 #include "xquery/Object.h"
 

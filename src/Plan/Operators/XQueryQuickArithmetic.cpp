@@ -12,10 +12,13 @@
 //                      the other one of these or exactly xs:integer or xs:decimal. The common type
 //                      is xs:double; an untyped operand is cast by scanning its text, and an exact
 //                      one by scanning what it prints.
+#include "Plan/Operators/XQueryQuickArithmetic.h"
+
 #include "Expr/Operators/XQueryArithmetic.h"
-#include "Expr/Operators/XQueryNumericOperand.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Platform/Base/LastingObjects.h"
 #include "Types/XQueryNumber.h"
+#include "Types/XQueryNumericOperand.h"
 
 #include <cmath>
 #include <cstdint>
@@ -107,9 +110,7 @@ Value doubleAnswer(int type, double a, double b) {
   }
 }
 
-}  // namespace
-
-Value XQueryArithmeticShortcut(int type, const NSObject* left, const NSObject* right) {
+Value answerFor(int type, const NSObject* left, const NSObject* right) {
   // For idiv an untyped operand is an integer, which is not what a scanned double tells.
   const bool untypedOnes = type != XQueryOperatorIDiv;
   const auto a = XQueryNumericOperand::of(left, untypedOnes);
@@ -125,6 +126,23 @@ Value XQueryArithmeticShortcut(int type, const NSObject* left, const NSObject* r
     if (answer) return answer;
   }
   return exactAnswer(type, *a.exact, *b.exact, bothIntegers);
+}
+
+}  // namespace
+
+Value XQueryQuickArithmetic(int type, const Value& left, const Value& right, XQueryContext&) {
+  return answerFor(type, left.get(), right.get());
+}
+
+Value XQueryQuickSign(int type, const Value&, const Value& operand, XQueryContext&) {
+  // Adding to an integer leaves each of these operands in its own type.
+  static const Ref<XQueryNumber> zero = [] {
+    const LastingObjects lasting;
+    Ref<XQueryNumber> integer = XQueryNumber::integerWithInt64(0);
+    integer->makeImmortal();
+    return integer;
+  }();
+  return answerFor(type, zero.get(), operand.get());
 }
 
 }  // namespace xquery

@@ -1,4 +1,4 @@
-#include "Expr/Operators/XQueryNumericOperand.h"
+#include "Types/XQueryNumericOperand.h"
 
 namespace xquery {
 

@@ -11,35 +11,26 @@
 //                number (scanning is how it is cast, and a double is compared by double).
 //
 // When no pair can fail and there are many, not every pair has to be looked at: an order relation
-// is decided by the extremes of both sides, equality by a binary search. A range of integers is not
-// even made for that: an item is compared with its bounds.
+// is decided by the extremes of both sides, equality by a binary search.
+#include "Plan/Operators/XQueryQuickComparison.h"
+
 #include "Expr/Operators/XQueryArithmetic.h"
 #include "Expr/Operators/XQueryComparison.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
-#include "Expr/Operators/XQueryUntypedText.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Operators/XQueryComparand.h"
 #include "Platform/Base/WorkMeter.h"
-#include "Types/XQueryAtomization.h"
-#include "Types/XQueryCasting.h"
-#include "Types/XQueryNumber.h"
+#include "Types/XQueryString.h"
 #include "xquery/Collection.h"
 
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
-#include <limits>
 #include <optional>
-#include <utility>
 #include <vector>
 
 namespace xquery {
 namespace {
-
-constexpr int generalToValue = XQueryOperatorEq - XQueryOperatorEqual;
-
-bool isGeneralComparison(int type) {
-  return type >= XQueryOperatorEqual && type <= XQueryOperatorGreaterEqual;
-}
 
 enum class Answer : uint8_t { No, Yes, Unknown };
 
@@ -55,81 +46,28 @@ int orderOf(NSStringView a, NSStringView b) {
   return a.compare(b);
 }
 
-// One item of an operand, with what comparing it has found out.
-class Comparand {
- public:
-  // Nodes and atomic values.
-  static bool isPossible(const NSObject* item) {
-    return item && (item->isNode() || XQueryIsAtomicType(item));
-  }
+// Exactly xs:integer, in a machine word.
+const NSDecimal* smallInteger(const XQueryNumber& number) {
+  if (number.typeID() != XQueryTypeInteger) return nullptr;
+  const NSDecimal* decimal = number.storedDecimal();
+  return decimal && decimal->isSmallInteger() ? decimal : nullptr;
+}
 
-  explicit Comparand(NSObject* item)
-      : _item(item),
-        _type(item->isNode() ? XQueryTypeID{XQueryTypeUntypedAtomic} : XQueryObjectTypeID(item)),
-        _primitive(XQueryPrimitiveTypeForTypeID(_type)) {
-    if (isUntyped() || _primitive == XQueryTypeString) _text = XQueryUntypedText(*item);
+// Null unless both operands are typed numbers (which the durations are not). Numbers are compared
+// by their order, no relation holding for NaN; comparing integers in a word is that for them.
+Value compareTypedNumbers(XQueryRelation relation, const NSObject* left, const NSObject* right) {
+  const auto* a = dyn_cast<XQueryNumber>(left);
+  const auto* b = a ? dyn_cast<XQueryNumber>(right) : nullptr;
+  if (!b) return Value();
+  const NSDecimal* x = smallInteger(*a);
+  const NSDecimal* y = x ? smallInteger(*b) : nullptr;
+  if (y) {
+    return NSNumber::numberWithBool(relation.holds(orderOf(x->smallInteger(), y->smallInteger())));
   }
-
-  XQueryTypeID type() const { return _type; }
-  bool isUntyped() const { return _type == XQueryTypeUntypedAtomic; }
-  bool isStringType() const { return _primitive == XQueryTypeString; }
-  // Casting it to xs:string keeps its text.
-  bool isText() const { return isUntyped() || _type == XQueryTypeString; }
-  bool isNumeric() const {
-    return _primitive >= XQueryTypeDouble && _primitive <= XQueryTypeDecimal;
-  }
-  // A number that has digits of its own.
-  bool isExact() const {
-    if (!isNumeric()) return false;
-    const NSNumber::Storage storage = number().storage();
-    return storage != NSNumber::Storage::Double && storage != NSNumber::Storage::Float;
-  }
-  const NSNumber& number() const { return *cast<NSNumber>(_item); }
-  NSStringView text() const { return _text.view(); }
-
-  // A number's value, or the number that an untyped text begins with; nothing when there is none.
-  std::optional<double> asDouble() {
-    if (!_scanned) {
-      _scanned = true;
-      if (isNumeric()) {
-        _double = number().doubleValue();
-      } else if (double value = 0; isUntyped() && scanDouble(text(), value)) {
-        _double = value;
-      }
-    }
-    return _double;
-  }
-
-  // Exactly xs:integer in a machine word.
-  std::optional<int64_t> asSmallInteger() const {
-    if (_type != XQueryTypeInteger) return std::nullopt;
-    const NSDecimal* decimal = number().storedDecimal();
-    if (!decimal || !decimal->isSmallInteger()) return std::nullopt;
-    return decimal->smallInteger();
-  }
-
-  // The item's typed value, cast to `target` unless that is 0; each cast is done once.
-  Value valueAs(XQueryTypeID target, XQueryContext& context) {
-    if (!_typed) _typed = XQueryTypedValue(_item, context);
-    if (target == XQueryTypeNone) return _typed;
-    for (const auto& [type, value] : _casts) {
-      if (type == target) return value;
-    }
-    Value value = XQueryCastAsTypeForContext(_typed, target, context);
-    _casts.emplace_back(target, value);
-    return value;
-  }
-
- private:
-  NSObject* _item;  // kept alive by the operand
-  XQueryTypeID _type;
-  XQueryTypeID _primitive;
-  XQueryUntypedText _text;
-  bool _scanned = false;
-  std::optional<double> _double;
-  Value _typed;
-  std::vector<std::pair<XQueryTypeID, Value>> _casts;
-};
+  if (!XQueryIsNumericTypeID(a->typeID()) || !XQueryIsNumericTypeID(b->typeID())) return Value();
+  if (XQueryIsNaN(*a) || XQueryIsNaN(*b)) return NSNumber::numberWithBool(false);
+  return NSNumber::numberWithBool(relation.holds(a->compare(*b)));
+}
 
 // An operand of any number of items.
 class Side {
@@ -141,26 +79,26 @@ class Side {
     WorkPacer pacer;
     for (size_t index = 0; index < items.count(); ++index) {
       pacer.turn();
-      if (!Comparand::isPossible(items[index])) return false;
+      if (!XQueryComparand::isPossible(items[index])) return false;
       _items.emplace_back(items[index]);
     }
     return true;
   }
 
   size_t count() const { return _items.size(); }
-  Comparand& operator[](size_t index) { return _items[index]; }
+  XQueryComparand& operator[](size_t index) { return _items[index]; }
 
   template <class Condition>
   bool all(Condition condition) {
     WorkPacer pacer;
-    return std::all_of(_items.begin(), _items.end(), [&](Comparand& item) {
+    return std::all_of(_items.begin(), _items.end(), [&](XQueryComparand& item) {
       pacer.turn();
       return condition(item);
     });
   }
 
  private:
-  std::vector<Comparand> _items;
+  std::vector<XQueryComparand> _items;
 };
 
 Answer compareTexts(XQueryRelation relation, NSStringView a, NSStringView b) {
@@ -168,7 +106,7 @@ Answer compareTexts(XQueryRelation relation, NSStringView a, NSStringView b) {
   return answered(relation.holds(a.compare(b)));
 }
 
-Answer compareNumbers(XQueryRelation relation, Comparand& a, Comparand& b) {
+Answer compareNumbers(XQueryRelation relation, XQueryComparand& a, XQueryComparand& b) {
   if (a.isExact() && b.isExact()) {
     if (XQueryIsNaN(a.number()) || XQueryIsNaN(b.number())) return Answer::No;
     return answered(relation.holds(a.number().compare(b.number())));
@@ -180,14 +118,14 @@ Answer compareNumbers(XQueryRelation relation, Comparand& a, Comparand& b) {
   return answered(relation.holds(orderOf(*x, *y)));
 }
 
-Answer compareWithoutCasting(XQueryRelation relation, Comparand& a, Comparand& b) {
+Answer compareWithoutCasting(XQueryRelation relation, XQueryComparand& a, XQueryComparand& b) {
   const bool asStrings = (a.isText() && b.isText()) || (a.isStringType() && b.isStringType());
   if (asStrings) return compareTexts(relation, a.text(), b.text());
   if (a.isNumeric() || b.isNumeric()) return compareNumbers(relation, a, b);
   return Answer::Unknown;
 }
 
-Value comparePair(int code, Comparand& a, Comparand& b, XQueryContext& context) {
+Value comparePair(int code, XQueryComparand& a, XQueryComparand& b, XQueryContext& context) {
   const Answer answer = compareWithoutCasting(XQueryRelationForCode(code), a, b);
   if (answer != Answer::Unknown) return NSNumber::numberWithBool(answer == Answer::Yes);
   const XQueryPairTargets targets = XQueryGeneralComparisonTargets(a.type(), b.type());
@@ -250,84 +188,65 @@ Answer compareByKeys(XQueryRelation relation, Side& left, Side& right, KeyOf key
 
 // Unknown when the sides are too mixed, or some pair may fail.
 Answer compareManyPairs(XQueryRelation relation, Side& left, Side& right) {
-  const auto isText = [](Comparand& item) { return item.isText(); };
+  const auto isText = [](XQueryComparand& item) { return item.isText(); };
   if (left.all(isText) && right.all(isText)) {
     return compareByKeys<NSStringView>(relation, left, right,
-                                       [](Comparand& item) { return item.text(); });
+                                       [](XQueryComparand& item) { return item.text(); });
   }
-  const auto isSmallInteger = [](Comparand& item) { return item.asSmallInteger().has_value(); };
+  const auto isSmallInteger = [](XQueryComparand& item) {
+    return item.asSmallInteger().has_value();
+  };
   if (left.all(isSmallInteger) && right.all(isSmallInteger)) {
     return compareByKeys<int64_t>(relation, left, right,
-                                  [](Comparand& item) { return *item.asSmallInteger(); });
+                                  [](XQueryComparand& item) { return *item.asSmallInteger(); });
   }
   // By double when every pair has a double: one side is all doubles (or untyped, with numbers on
   // the other side only).
-  const auto isDouble = [](Comparand& item) {
+  const auto isDouble = [](XQueryComparand& item) {
     return item.type() == XQueryTypeDouble && item.number().storage() == NSNumber::Storage::Double;
   };
-  const auto isUntyped = [](Comparand& item) { return item.isUntyped(); };
-  const auto isNumeric = [](Comparand& item) { return item.isNumeric(); };
+  const auto isUntyped = [](XQueryComparand& item) { return item.isUntyped(); };
+  const auto isNumeric = [](XQueryComparand& item) { return item.isNumeric(); };
   const bool byDouble = (left.all(isUntyped) && right.all(isNumeric)) ||
                         (left.all(isNumeric) && right.all(isUntyped)) ||
                         (left.all(isDouble) && right.all(isDouble));
-  const auto isOrdered = [](Comparand& item) {
+  const auto isOrdered = [](XQueryComparand& item) {
     const std::optional<double> value = item.asDouble();
     return value && !std::isnan(*value);
   };
   if (!byDouble || !left.all(isOrdered) || !right.all(isOrdered)) return Answer::Unknown;
   return compareByKeys<double>(relation, left, right,
-                               [](Comparand& item) { return *item.asDouble(); });
+                               [](XQueryComparand& item) { return *item.asDouble(); });
 }
 
-// --- ranges --------------------------------------------------------------------------------------
-
-// Every integer up to this magnitude is a double, and compares with doubles as itself.
-constexpr int64_t exactIntegerBound = int64_t{1} << std::numeric_limits<double>::digits;
-
-bool isWhole(int64_t) {
-  return true;
-}
-bool isWhole(double value) {
-  return value == std::trunc(value);
-}
-
-// Whether the relation holds between the value and any integer from `first` to `last`.
-template <class Number>
-bool holdsForRange(XQueryRelation relation, Number value, int64_t first, int64_t last) {
-  const auto low = static_cast<Number>(first);
-  const auto high = static_cast<Number>(last);
-  switch (relation.test) {
-    case XQueryRelation::Equal:
-      if (relation.negated) return first != last || value != low;
-      return value >= low && value <= high && isWhole(value);
-    case XQueryRelation::Less:
-      return relation.negated ? value >= low : value < high;
-    case XQueryRelation::Greater:
-      return relation.negated ? value <= high : value > low;
-  }
-  return false;
-}
-
-Answer compareWithRange(XQueryRelation relation, Comparand& item, int64_t first, int64_t last) {
-  if (const auto value = item.asSmallInteger()) {
-    return answered(holdsForRange(relation, *value, first, last));
-  }
-  const bool isDouble = item.isUntyped() || item.type() == XQueryTypeDouble;
-  const std::optional<double> value = isDouble ? item.asDouble() : std::nullopt;
-  if (!value) return Answer::Unknown;
-  return answered(!std::isnan(*value) && holdsForRange(relation, *value, first, last));
+bool hasText(const NSObject* operand) {
+  return XQueryIsUntyped(operand) || isa<XQueryString>(operand);
 }
 
 }  // namespace
 
-Value XQueryGeneralComparisonShortcut(int type, const Value& left, const Value& right,
-                                      XQueryContext& context) {
-  if (!isGeneralComparison(type) || !left || !right) return Value();
-  const int code = type + generalToValue;
+Value XQueryQuickValueComparison(int type, const Value& left, const Value& right, XQueryContext&) {
+  const XQueryRelation relation = XQueryRelationForCode(type);
+  // An untyped operand is compared as a string, and so is every string type.
+  if (hasText(left.get()) && hasText(right.get())) {
+    const XQueryUntypedText a(*left);
+    const XQueryUntypedText b(*right);
+    return NSNumber::numberWithBool(compareTexts(relation, a.view(), b.view()) == Answer::Yes);
+  }
+  return compareTypedNumbers(relation, left.get(), right.get());
+}
+
+Value XQueryQuickGeneralComparison(int type, const Value& left, const Value& right,
+                                   XQueryContext& context) {
+  if (!left || !right) return Value();
+  const int code = type + XQueryOperatorEq - XQueryOperatorEqual;
+  // Most comparisons are of two single numbers, which need no conversion.
+  const XQueryRelation relation = XQueryRelationForCode(code);
+  if (Value truth = compareTypedNumbers(relation, left.get(), right.get())) return truth;
   // Most operands are single items, which need no list.
-  if (Comparand::isPossible(left.get()) && Comparand::isPossible(right.get())) {
-    Comparand a(left.get());
-    Comparand b(right.get());
+  if (XQueryComparand::isPossible(left.get()) && XQueryComparand::isPossible(right.get())) {
+    XQueryComparand a(left.get());
+    XQueryComparand b(right.get());
     return comparePair(code, a, b, context);
   }
   Side leftSide;
@@ -335,7 +254,7 @@ Value XQueryGeneralComparisonShortcut(int type, const Value& left, const Value& 
   if (!leftSide.read(left) || !rightSide.read(right)) return Value();
   if (leftSide.count() == 0 || rightSide.count() == 0) return NSNull::null();
   if (leftSide.count() >= manyPairs / rightSide.count()) {
-    const Answer answer = compareManyPairs(XQueryRelationForCode(code), leftSide, rightSide);
+    const Answer answer = compareManyPairs(relation, leftSide, rightSide);
     if (answer != Answer::Unknown) return NSNumber::numberWithBool(answer == Answer::Yes);
   }
   WorkPacer pacer;
@@ -345,29 +264,6 @@ Value XQueryGeneralComparisonShortcut(int type, const Value& left, const Value& 
       Value answer = comparePair(code, leftSide[i], rightSide[j], context);
       if (!(answer.get() == NSNumber::falseValue())) return answer;
     }
-  }
-  return NSNumber::falseValue();
-}
-
-Value XQueryGeneralComparisonWithRange(int type, const Value& left, int64_t first, int64_t last) {
-  if (!isGeneralComparison(type) || first < -exactIntegerBound || last > exactIntegerBound) {
-    return Value();
-  }
-  const XQueryRelation relation = XQueryRelationForCode(type + generalToValue);
-  const XQueryItemList items(left.get());
-  if (items.count() == 0) return left ? Value(NSNull::null()) : Value();
-  // An item that cannot be atomized fails before any pair is looked at.
-  WorkPacer pacer;
-  for (size_t i = 0; i < items.count(); ++i) {
-    pacer.turn();
-    if (!Comparand::isPossible(items[i])) return Value();
-  }
-  for (size_t i = 0; i < items.count(); ++i) {
-    pacer.turn();
-    Comparand item(items[i]);
-    const Answer answer = compareWithRange(relation, item, first, last);
-    if (answer == Answer::Unknown) return Value();
-    if (answer == Answer::Yes) return NSNumber::trueValue();
   }
   return NSNumber::falseValue();
 }
