@@ -30,6 +30,9 @@ constexpr std::array rules = {
                XQueryShortenPaths},
     XQueryRule{"operands", "arithmetic and comparisons of numbers and texts make no values between",
                XQueryAnswerQuickly},
+    XQueryRule{"constructors",
+               "what is constructed for another node is made in the tree of that one",
+               XQueryBuildInPlace},
     // Behind what replaces keys and probes, which joins evaluate.
     XQueryRule{"for-joins", "the where clause picks items of the for clauses by their keys",
                XQueryJoinForClauses},

@@ -37,5 +37,6 @@ void XQueryAskMembers(XQueryPlanning& planning);
 void XQueryCompareConstants(XQueryPlanning& planning);
 void XQueryShortenPaths(XQueryPlanning& planning);
 void XQueryAnswerQuickly(XQueryPlanning& planning);
+void XQueryBuildInPlace(XQueryPlanning& planning);
 
 }  // namespace xquery

@@ -255,7 +255,7 @@ class ProgramGenerator {
   }
 
   std::string constructor(int depth) {
-    switch (_random.below(5)) {
+    switch (_random.below(6)) {
       case 0:
         return "<b x='{" + operand(depth - 1) + "}'>{" + expr(depth - 1) + "}</b>";
       case 1:
@@ -264,9 +264,37 @@ class ProgramGenerator {
         return "text {" + expr(depth - 1) + "}";
       case 3:
         return "document {<a>{" + expr(depth - 1) + "}</a>}";
+      case 4:
+        return growingTree(depth);
       default:
         return "<c>{" + variable() + ", count(" + variable() + "/..)}</c>";
     }
+  }
+
+  // Nodes that are looked at while the elements that have taken them in are still being made.
+  std::string growingTree(int depth) {
+    static const std::vector<std::string> nodes = {"$n",    "$m",      "<b/>", "attribute y {1}",
+                                                   "$n/..", "root($m)"};
+    static const std::vector<std::string> questions = {
+        "$n << $m",
+        "$m << $n",
+        "count(root($m)//node())",
+        "name(root($n))",
+        "$m/..",
+        "(for $k in ($m | $n | root($n)//a) return name($k))",
+        "root($n) is root($m)",
+        "base-uri($n)",
+        "name($n/following::*[1])"};
+    const auto part = [&] {
+      return "{" + (_random.below(3) ? _random.oneOf(questions) : _random.oneOf(nodes)) + "}";
+    };
+    const std::string inner = "<b>" + part() + part() + "<c>" + part() + "</c>" + part() + "</b>";
+    const std::string loop = _random.below(2) ? "{for $i in 1 to 2 return " + inner + "}"
+                                              : "{if (" + comparison(depth - 1) + ") then " +
+                                                    inner + " else element d {" +
+                                                    _random.oneOf(nodes) + ", attribute x {2}}}";
+    return "(let $n := <a><b/></a>, $m := <a><c/></a> return <a>" + part() + loop + part() +
+           "</a>)";
   }
 
   std::string call(int depth) {

@@ -30,10 +30,6 @@ NSXMLNameRef attributeName(const XQueryConstructorName& expr, XQueryContext& con
   return name;
 }
 
-Value attribute(NSXMLNameRef name, const NSMutableString& text) {
-  return Ref<NSXMLNode>(NSXMLTree::makeLoneAttribute(name.detach(), text.view()));
-}
-
 }  // namespace
 
 Ref<XQueryAttributeExpr> XQueryAttributeExpr::attributeExprWithName(
@@ -56,7 +52,7 @@ Value XQueryAttributeExpr::computeValue(XQueryContext& context) const {
   NSXMLNameRef name = attributeName(_name, context, exprLine());
   NSMutableString text;
   if (!name || !appendValueText(text, context)) return {};
-  return attribute(std::move(name), text);
+  return Ref<NSXMLNode>(NSXMLTree::makeLoneAttribute(name.detach(), text.view()));
 }
 
 bool XQueryAttributeExpr::addTo(XQueryElementContent& content, XQueryContext& context) const {
@@ -114,7 +110,8 @@ Value XQueryComputedAttributeExpr::computeValue(XQueryContext& context) const {
     XQueryAppendText(value, text, context);
   }
   XQueryNormalizeAttributeString(text);
-  return attribute(std::move(name), text);
+  return Ref<NSXMLNode>(_isInPlace ? NSXMLTree::makeAttributeInPlace(name.detach(), text.view())
+                                   : NSXMLTree::makeLoneAttribute(name.detach(), text.view()));
 }
 
 }  // namespace xquery

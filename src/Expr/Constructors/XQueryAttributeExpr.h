@@ -60,6 +60,8 @@ class XQueryComputedAttributeExpr : public XQueryExpr {
   [[nodiscard]] static Ref<XQueryComputedAttributeExpr> computedAttributeExprWithName(
       Ref<XQueryExpr> name, Ref<XQueryExpr> value);
 
+  // As XQueryElementExpr::buildInPlace.
+  void buildInPlace() { _isInPlace = true; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
   void visitParts(XQueryPartVisitor& visitor) override;
@@ -73,6 +75,7 @@ class XQueryComputedAttributeExpr : public XQueryExpr {
  private:
   XQueryConstructorName _name;
   Ref<XQueryExpr> _value;
+  bool _isInPlace = false;
 };
 
 }  // namespace xquery

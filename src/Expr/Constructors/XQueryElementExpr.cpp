@@ -111,7 +111,9 @@ Value XQueryElementExpr::computeValue(XQueryContext& context) const {
   NSXMLNameRef name = _name.evaluate(context, exprLine());
   if (!name) return {};
   NSXMLRoom room;
-  const Ref<NSXMLElement> element = NSXMLTree::makeLoneElement(name.detach(), _roomBytes, room);
+  const Ref<NSXMLElement> element =
+      _isInPlace ? NSXMLTree::makeElementInPlace(name.detach(), _roomBytes, room)
+                 : NSXMLTree::makeLoneElement(name.detach(), _roomBytes, room);
   XQueryElementContent content(*element, room, namespaces, context, exprLine());
   dynamic.setBaseURI(dynamic.baseURI(), element.get());
   for (const auto& declaration : _namespaces) {

@@ -23,6 +23,9 @@ class XQueryElementExpr : public XQueryExpr {
                                                                       Ref<XQueryExpr> value);
 
   const XQueryConstructorName& name() const { return _name; }
+  // The element is content of the constructor around it and known to nobody else before it is in
+  // there: it is made in the tree of its parent. Set while a query is planned.
+  void buildInPlace() { _isInPlace = true; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
   void visitParts(XQueryPartVisitor& visitor) override;
@@ -42,6 +45,7 @@ class XQueryElementExpr : public XQueryExpr {
   XQueryConstructorName _name;
   Exprs _attributes;  // attribute and namespace expressions
   Exprs _items;
+  bool _isInPlace = false;
   size_t _roomBytes = 0;                    // for the attributes and the text of an element
   std::vector<Ref<NSXMLNode>> _namespaces;  // declared with literal URIs; copied into each element
 };

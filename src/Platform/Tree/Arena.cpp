@@ -446,16 +446,36 @@ NSXMLElement* NSXMLTree::makeLoneElement(NSStringView name, NSStringView URI) {
                              [](NSXMLTree& tree) { return tree.makeElement(); });
 }
 
+NSXMLElement* NSXMLTree::makeElement(size_t roomBytes, NSXMLRoom& room) {
+  const size_t bytes = sizeof(NSXMLElement) + roomBytes;
+  NSXMLBlock* block = allocateBlock(bytes);
+  auto* element = placeNode<NSXMLElement>(block + 1, uint16_t{sizeof(NSXMLBlock) / distanceUnit});
+  room._block = reinterpret_cast<char*>(block);
+  room._cursor = reinterpret_cast<char*>(element + 1);
+  room._end = room._block + roundedUp(sizeof(NSXMLBlock) + bytes, blockGranule);
+  return element;
+}
+
 NSXMLElement* NSXMLTree::makeLoneElement(const NSXMLName* name, size_t roomBytes, NSXMLRoom& room) {
-  return NewTree().withNamed(name, [&](NSXMLTree& tree) {
-    const size_t bytes = sizeof(NSXMLElement) + roomBytes;
-    NSXMLBlock* block = tree.allocateBlock(bytes);
-    auto* element = placeNode<NSXMLElement>(block + 1, uint16_t{sizeof(NSXMLBlock) / distanceUnit});
-    room._block = reinterpret_cast<char*>(block);
-    room._cursor = reinterpret_cast<char*>(element + 1);
-    room._end = room._block + roundedUp(sizeof(NSXMLBlock) + bytes, blockGranule);
-    return element;
-  });
+  return NewTree().withNamed(name,
+                             [&](NSXMLTree& tree) { return tree.makeElement(roomBytes, room); });
+}
+
+NSXMLElement* NSXMLTree::makeElementInPlace(const NSXMLName* name, size_t roomBytes,
+                                            NSXMLRoom& room) {
+  NSXMLTree& tree = *of(&NSXMLUnfinished::innermost()->node());
+  tree.adopt(name);
+  NSXMLElement* element = tree.makeElement(roomBytes, room);
+  setAdoptedName(element, name);
+  return element;
+}
+
+NSXMLNode* NSXMLTree::makeAttributeInPlace(const NSXMLName* name, NSStringView text) {
+  NSXMLTree& tree = *of(&NSXMLUnfinished::innermost()->node());
+  tree.adopt(name);
+  NSXMLNode* attribute = tree.makeNode(Kind::Attribute, text);
+  setAdoptedName(attribute, name);
+  return attribute;
 }
 
 NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text, NSXMLRoom& room) {
@@ -482,6 +502,27 @@ NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text, NSXMLRoom& room) {
 NSXMLNode* NSXMLTree::makeLoneAttribute(const NSXMLName* name, NSStringView text) {
   return NewTree().withNamed(name,
                              [&](NSXMLTree& tree) { return tree.makeNode(Kind::Attribute, text); });
+}
+
+// --- nodes that are being filled --------------------------------------------------------------
+
+namespace {
+constinit thread_local const NSXMLUnfinished* innermostUnfinished
+    __attribute__((tls_model("initial-exec"))) = nullptr;
+}
+
+NSXMLUnfinished::NSXMLUnfinished(NSXMLNode& node)
+    : _node(node), _around(std::exchange(innermostUnfinished, this)) {
+  NSXMLTree::setUnfinished(&node, true);
+}
+
+NSXMLUnfinished::~NSXMLUnfinished() {
+  innermostUnfinished = _around;
+  NSXMLTree::setUnfinished(&_node, false);
+}
+
+const NSXMLUnfinished* NSXMLUnfinished::innermost() {
+  return innermostUnfinished;
 }
 
 // --- merging ---------------------------------------------------------------------------------
@@ -553,17 +594,26 @@ void NSXMLTree::noteChange(const NSXMLNode* parent) {
   }
 }
 
-namespace {
-
-// Both trees are to become one: if either had several roots, so has the sum.
-void prepareToJoin(NSXMLTree* parents, NSXMLTree* childs) {
+// Their trees are to become one: if either had several roots, so has the sum. Nodes that are made
+// in place are roots of their own as long as they are being filled, but while nothing is taken into
+// them from elsewhere, nobody can ask for the order of what is in them.
+void NSXMLTree::prepareToJoin(const NSXMLNode* parent, const NSXMLNode* child) {
+  NSXMLTree* const parents = of(parent);
+  NSXMLTree* const childs = of(child);
   if (parents == childs) return;
-  const bool several =
-      parents->order == NSXMLTreeHead::SeveralRoots || childs->order == NSXMLTreeHead::SeveralRoots;
-  parents->order = childs->order = several ? NSXMLTreeHead::SeveralRoots : NSXMLTreeHead::Stale;
+  bool several = parents->order == SeveralRoots || childs->order == SeveralRoots;
+  const auto isInSum = [&](const NSXMLUnfinished* open) {
+    return open && (of(&open->node()) == parents || of(&open->node()) == childs);
+  };
+  const NSXMLUnfinished* const innermost = NSXMLUnfinished::innermost();
+  if (isInSum(innermost) && isInSum(innermost->around())) [[unlikely]] {
+    several = true;
+    for (auto* open = innermost; isInSum(open); open = open->around()) {
+      open->node().rootNode()->_word = staleRoot;
+    }
+  }
+  parents->order = childs->order = several ? SeveralRoots : Stale;
 }
-
-}  // namespace
 
 bool NSXMLTree::isRootAbove(const NSXMLNode* node, const NSXMLNode* root) {
   return of(node) == of(root) && node->rootNode() == root;
@@ -580,7 +630,7 @@ bool NSXMLTree::adoptChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* befor
 }
 
 void NSXMLTree::insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before) {
-  prepareToJoin(of(parent), of(child));
+  prepareToJoin(parent, child);
   merge(of(parent), of(child));
   noteChange(parent);
   child->_parent = parent;
@@ -602,7 +652,7 @@ void NSXMLTree::insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* befo
 }
 
 void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property) {
-  prepareToJoin(of(element), of(property));
+  prepareToJoin(element, property);
   merge(of(element), of(property));
   noteChange(element);
   // Namespaces before attributes, each in the order of their arrival.
@@ -619,7 +669,7 @@ void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property, NSXML
     appendProperty(element, property);
     return;
   }
-  prepareToJoin(of(element), of(property));
+  prepareToJoin(element, property);
   merge(of(element), of(property));
   noteChange(element);
   property->_parent = element;

@@ -122,6 +122,11 @@ class NSXMLTree : public NSXMLTreeHead {
   // The tree takes over one count of the name. The room is of that many bytes at least.
   [[nodiscard]] static NSXMLElement* makeLoneElement(const NSXMLName* name, size_t roomBytes,
                                                      NSXMLRoom& room);
+  // The same in the tree of the node that the calling thread is filling. Nobody but who makes the
+  // element may know it before it is put into that node.
+  [[nodiscard]] static NSXMLElement* makeElementInPlace(const NSXMLName* name, size_t roomBytes,
+                                                        NSXMLRoom& room);
+  [[nodiscard]] static NSXMLNode* makeAttributeInPlace(const NSXMLName* name, NSStringView text);
   // An attribute or a text, in the room as far as that goes; in the element's tree in any case.
   NSXMLNode* makeNode(Kind kind, NSStringView text, NSXMLRoom& room);
   static constexpr size_t roomForNode = sizeof(NSXMLNode);
@@ -260,6 +265,9 @@ class NSXMLTree : public NSXMLTreeHead {
   void absorbExtra(NSXMLTree* smaller);
   void absorbBaseURIs(NSXMLTree* smaller);
   void freeBaseURIs();
+  // The element and the room behind it are one block.
+  NSXMLElement* makeElement(size_t roomBytes, NSXMLRoom& room);
+  static void prepareToJoin(const NSXMLNode* parent, const NSXMLNode* child);
   // Before the structure under `parent` changes.
   static void noteChange(const NSXMLNode* parent);
   // Before anything of the tree changes: what is known of it goes.
@@ -292,16 +300,23 @@ class NSXMLTree : public NSXMLTreeHead {
 
 static_assert(sizeof(NSXMLTree) == 48 && sizeof(NSXMLBaseURI) == 32);
 
-// The time in which a constructor fills a new node, the root of its tree.
+// The time in which a constructor fills a new node, which has no parent yet.
 class NSXMLUnfinished {
  public:
-  explicit NSXMLUnfinished(NSXMLNode& node) : _node(node) { NSXMLTree::setUnfinished(&node, true); }
-  ~NSXMLUnfinished() { NSXMLTree::setUnfinished(&_node, false); }
+  explicit NSXMLUnfinished(NSXMLNode& node);
+  ~NSXMLUnfinished();
   NSXMLUnfinished(const NSXMLUnfinished&) = delete;
   NSXMLUnfinished& operator=(const NSXMLUnfinished&) = delete;
 
+  // What the thread is filling now; null for nothing.
+  static const NSXMLUnfinished* innermost();
+  // What it was filling already when this began.
+  const NSXMLUnfinished* around() const { return _around; }
+  NSXMLNode& node() const { return _node; }
+
  private:
   NSXMLNode& _node;
+  const NSXMLUnfinished* const _around;
 };
 
 }  // namespace xquery
