@@ -65,9 +65,6 @@ void XQueryFunctionCall::bindInfoForProlog(XQueryProlog& prolog) {
     if (const auto* entry = XQueryBuiltInFunction::entryForQName(qName)) {
       _builtIn = entry;
       _function = entry->proc();
-      _readsArgumentsOnly = entry->row().readsArgumentsOnly(argumentCount());
-      _loadsDocuments = entry->row().has(XQueryBuiltInFunction::LoadsDocuments);
-      _answersTruth = entry->row().answersTruth();
     }
     if (!_function) _functionDecl = prolog.functionInfoForSignature({qName, argumentCount()});
   }

@@ -1,17 +1,19 @@
 // A call of a built-in or a declared function.
 #pragma once
 
-#include "Expr/XQueryCallExpr.h"
+#include "Expr/XQueryExpr.h"
+#include "Expr/XQueryLists.h"
 #include "Functions/XQueryBuiltInFunction.h"
 
 #include <cstddef>
 #include <span>
+#include <utility>
 
 namespace xquery {
 
 class XQueryFunctionDecl;
 
-class XQueryFunctionCall : public XQueryCallExpr {
+class XQueryFunctionCall : public XQueryExpr {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::FunctionCall; }
 
@@ -20,6 +22,7 @@ class XQueryFunctionCall : public XQueryCallExpr {
                                                                     Ref<XQueryArgs> withArgs);
 
   const Ref<NSString>& name() const { return _name; }
+  XQueryArgs* args() const { return _args.get(); }
   // What binding found: a procedure, a declaration (owned by its prolog), or neither.
   XQueryProcedure function() const { return _function; }
   // The entry of the procedure in the registry; null for a function that is not built in.
@@ -45,7 +48,7 @@ class XQueryFunctionCall : public XQueryCallExpr {
 
  protected:
   XQueryFunctionCall(Ref<NSString> name, Ref<XQueryArgs> args)
-      : XQueryCallExpr(std::move(args)), _name(std::move(name)) {}
+      : XQueryExpr(Kind::FunctionCall), _name(std::move(name)), _args(std::move(args)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
@@ -63,6 +66,7 @@ class XQueryFunctionCall : public XQueryCallExpr {
   [[gnu::noinline, gnu::cold]] Value failInvalidArguments(XQueryContext& context) const;
 
   Ref<NSString> _name;
+  Ref<XQueryArgs> _args;
   XQueryProcedure _function = nullptr;
   const XQueryBuiltInFunction* _builtIn = nullptr;
   XQueryFunctionDecl* _functionDecl = nullptr;

@@ -13,6 +13,7 @@
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Functions/XQueryFunctionCall.h"
+#include "Plan/Paths/XQueryWalkedPath.h"
 #include "Types/XQueryQName.h"
 #include "Types/XQueryValues.h"
 
@@ -111,10 +112,24 @@ std::string labelOfAxisStep(const XQueryAxisStep& step) {
                                                      "preceding-sibling::",
                                                      "ancestor-or-self::"};
   if (step.axis() == XQueryAxisParent && isAnyNode(step)) return "..";
-  // In the place of a union of steps.
-  const bool isUnion = step.choice() && step.predicatesInTest() == 0;
-  return std::string(axes.at(static_cast<size_t>(step.axis()))) +
-         (isUnion ? textOf(step.choice()->description()) : labelOfTest(step.expr()));
+  return std::string(axes.at(static_cast<size_t>(step.axis()))) + labelOfTest(step.expr());
+}
+
+// "a | @b"; empty for anything but a union of single steps.
+std::string labelOfNames(const XQueryExpr* expr) {
+  constexpr int mostNames = 8;
+  std::string label;
+  for (int i = 0; i < mostNames; ++i) {
+    const auto* joint = dyn_cast<XQueryOperatorExpr>(expr);
+    const bool isUnion = joint && joint->operatorType() == XQueryOperatorUnion;
+    const XQueryPathExpr* path = XQueryPathIn(isUnion ? joint->right() : expr);
+    const auto* step = path ? dyn_cast<XQueryAxisStep>(path->step()) : nullptr;
+    if (!step || step->next() || !step->predicates().empty()) return "";
+    label = labelOfAxisStep(*step) + (label.empty() ? "" : " | ") + label;
+    if (!isUnion) return label;
+    expr = joint->left();
+  }
+  return "";
 }
 
 // What a filter step filters stands below as a part of its own, unless it is brief.
@@ -127,8 +142,10 @@ std::string labelOfPrimary(const XQueryExpr* expr) {
     case Kind::Literal:
     case Kind::FunctionCall:
       return XQueryLabelOf(*inside);
-    default:
-      return "(...)";
+    default: {
+      const std::string names = labelOfNames(inside);
+      return names.empty() ? "(...)" : "(" + names + ")";
+    }
   }
 }
 

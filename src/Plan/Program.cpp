@@ -204,10 +204,6 @@ bool XQueryProgram::isSurelySet(XQueryPlaceID variable) const {
   return variable < _places[whole].end && _places[binder].expr == items.back().get();
 }
 
-void XQueryProgram::keep(Ref<XQueryStep> step) {
-  _replacedSteps.emplace_back(std::move(step));
-}
-
 Ref<XQueryExpr> XQueryProgram::install() {
   Ref<XQueryExpr> main;
   for (XQueryProgramBody& body : _bodies) {

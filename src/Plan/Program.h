@@ -102,8 +102,6 @@ class XQueryProgram {
   void replace(XQueryPlaceID place, Ref<XQueryExpr> expr) {
     _replaced.push_back(std::exchange(*_places[place].slot, std::move(expr)));
   }
-  // Keeps a step that was taken out of its path for as long as places refer to it.
-  void keep(Ref<XQueryStep> step);
   // Hands the bodies back to the declarations; the body of the query is the answer.
   Ref<XQueryExpr> install();
 
@@ -112,7 +110,6 @@ class XQueryProgram {
   void addModules(const XQueryProlog& main);
   friend class XQueryProgramReader;
 
-  std::vector<Ref<NSCounted>> _replacedSteps;
   XQueryPlanList<Ref<XQueryExpr>> _replaced;
   XQueryPlanList<XQueryProgramBody> _bodies;
   XQueryPlanList<XQueryPlace> _places;

@@ -6,10 +6,12 @@ namespace xquery {
 namespace {
 
 constexpr std::array rules = {
+    XQueryRule{"paths", "an operator walks it, which further rules know of", XQueryWalkPaths},
     XQueryRule{"name tests", "a filter or a union of names becomes the test of one step",
                XQueryTakeNames},
     XQueryRule{"positions", "a position that is compared with a number is asked for by number",
                XQueryTakePositions},
+    XQueryRule{"walks", "no node is walked twice, and no further than needed", XQueryKeepTrails},
     XQueryRule{"constants", "what consists of literals alone is evaluated once, beforehand",
                XQueryFoldConstants},
     XQueryRule{"names", "comparing name() or local-name() with a constant makes no string",

@@ -22,6 +22,8 @@ struct XQueryRule {
 
 std::span<const XQueryRule> XQueryRules();
 
+void XQueryWalkPaths(XQueryPlanning& planning);
+void XQueryKeepTrails(XQueryPlanning& planning);
 void XQueryFoldConstants(XQueryPlanning& planning);
 void XQueryTakeNames(XQueryPlanning& planning);
 void XQueryTakePositions(XQueryPlanning& planning);

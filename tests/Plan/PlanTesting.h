@@ -82,7 +82,8 @@ inline std::string shownDeeds(const XQueryFacts& facts) {
   return text;
 }
 
-// The operators of a planned expression and all that it holds, the outermost first.
+// The operators of a planned expression and all that it holds, the outermost first, but for those
+// that walk a path as it is written.
 class OperatorList final : public XQueryPartVisitor {
  public:
   explicit OperatorList(XQueryExpr& expr) { look(expr); }
@@ -97,7 +98,8 @@ class OperatorList final : public XQueryPartVisitor {
 
  private:
   void look(XQueryExpr& expr) {
-    if (const auto* planned = dyn_cast<XQueryPlannedExpr>(&expr)) operators.push_back(planned);
+    const auto* planned = dyn_cast<XQueryPlannedExpr>(&expr);
+    if (planned && !planned->walkedPath()) operators.push_back(planned);
     expr.visitParts(*this);
   }
 };

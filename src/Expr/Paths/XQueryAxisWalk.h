@@ -1,4 +1,4 @@
-// The twelve axes, and one that joins two of them.
+// The twelve axes.
 //
 // XQueryWalkAxis visits the nodes on an axis of a node, in the order in which a path sees them:
 // document order for the forward axes and for preceding, nearest first for the other reverse axes.
@@ -11,7 +11,6 @@
 
 #include "Expr/Paths/XQueryPath.h"
 #include "Platform/Base/WorkMeter.h"
-#include "Platform/Tree/TreeIndexes.h"
 #include "xquery/XMLNode.h"
 
 #include <vector>
@@ -54,64 +53,6 @@ void XQueryWalkNodes(NSXMLNode* first, const NSXMLNode* stop, const Visit& visit
     }
   }
 }
-
-template <class Act>
-void XQueryVisitIndexed(const NSXMLIndexedNodes& indexed, Act act) {
-  WorkPacer pacer;
-  for (NSXMLNode* node : indexed.nodes) {
-    pacer.turn();
-    if (!act(node)) return;
-  }
-}
-
-// Does something with the elements and attributes of a name and passes over all other nodes.
-template <class Act>
-class XQueryNamedVisit {
- public:
-  XQueryNamedVisit(const NSXMLExpandedName* name, Act act) : _name(name), _act(act) {}
-
-  bool operator()(NSXMLNode* found) {
-    const bool isNamed = found->kind() == Kind::Element || found->kind() == Kind::Attribute;
-    return !isNamed || found->expandedName() != _name || _act(found);
-  }
-  // In place of a walk, which would meet no attributes.
-  bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
-    const auto indexed = NSXMLIndexedElements(_name, first, stop);
-    if (!indexed) return false;
-    XQueryVisitIndexed(*indexed, _act);
-    return true;
-  }
-  bool visitIndexedAttributes(const NSXMLNode* first, const NSXMLNode* stop) const {
-    const auto indexed = NSXMLIndexedAttributes(_name, first, stop);
-    if (!indexed) return false;
-    XQueryVisitIndexed(*indexed, _act);
-    return true;
-  }
-
- private:
-  const NSXMLExpandedName* _name;
-  Act _act;
-};
-
-// The same for a test that takes several names and elements alone, or instructions as well.
-template <class Test, class Act>
-class XQueryChoiceVisit {
- public:
-  XQueryChoiceVisit(Test& test, Act act) : _test(test), _act(act) {}
-
-  bool operator()(NSXMLNode* found) { return !_test.matches(found) || _act(found); }
-  bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
-    const auto indexed =
-        NSXMLIndexedElements(*_test.onlyNames(), _test.acceptsInstructions(), first, stop);
-    if (!indexed) return false;
-    XQueryVisitIndexed(*indexed, _act);
-    return true;
-  }
-
- private:
-  Test& _test;
-  Act _act;
-};
 
 // The same without the ancestors of `stop` given, the outermost last.
 template <class Visit>
@@ -199,29 +140,6 @@ void XQueryWalkPrecedingSiblings(NSXMLNode* node, Visit& visit) {
   }
 }
 
-// Goes from nodes to their attributes.
-template <class Visit>
-class XQueryAttributesVisit {
- public:
-  explicit XQueryAttributesVisit(Visit& visit) : _visit(visit) {}
-
-  bool operator()(NSXMLNode* node) {
-    bool goesOn = true;
-    auto visitOne = [&](NSXMLNode* attribute) { return goesOn = _visit(attribute); };
-    XQueryWalkAttributes(node, visitOne);
-    return goesOn;
-  }
-  bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
-    if constexpr (requires { _visit.visitIndexedAttributes(first, stop); }) {
-      return _visit.visitIndexedAttributes(first, stop);
-    }
-    return false;
-  }
-
- private:
-  Visit& _visit;
-};
-
 template <class Visit>
 void XQueryWalkAxis(NSXMLNode* node, int axis, Visit visit) {
   switch (axis) {
@@ -252,8 +170,6 @@ void XQueryWalkAxis(NSXMLNode* node, int axis, Visit visit) {
       return XQueryWalkPrecedingSiblings(node, visit);
     case XQueryAxisAncestorOrSelf:
       return XQueryWalkAncestors(node, visit);
-    case XQueryAxisAttributesBelow:
-      return XQueryWalkNodes(node, XQueryDescendantStop(node), XQueryAttributesVisit(visit));
     default:  // no such axis: nothing is walked
       return;
   }

@@ -2,7 +2,6 @@
 
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryPath.h"
-#include "Platform/Tree/Arena.h"
 
 namespace xquery {
 namespace {
@@ -34,34 +33,9 @@ const NSXMLExpandedName* XQueryPathRun::nameForDeferredTest(const XQueryNameTest
   return _deferredNames.back().second.get();
 }
 
-XQueryAxisTrail& XQueryPathRun::trail(size_t index) {
-  if (_trails.empty()) _trails.resize(trailCount);
-  Trail& found = _trails[index];
-  if (found.changeCount != NSXMLTree::changeCount()) {
-    found.trail = XQueryAxisTrail();
-    found.changeCount = NSXMLTree::changeCount();
-  }
-  return found.trail;
-}
-
-XQueryNodeTest::XQueryNodeTest(const XQueryAxisStep& step, XQueryPathRun& run)
-    : _expr(step.expr()), _run(run), _choice(step.choice()) {
+XQueryNodeTest::XQueryNodeTest(const XQueryExpr* test, XQueryPathRun& run)
+    : _expr(test), _run(&run) {
   setTest();
-  if (_choice) setChoice();
-}
-
-// The test accepts nodes by their kind alone.
-void XQueryNodeTest::setChoice() {
-  if (const XQueryNameTest* only = _choice->onlyTest()) {
-    const uint32_t kinds = _kinds;
-    setNameTest(*only);
-    _kinds &= kinds;
-    _expr = only;
-    _choice = nullptr;
-    return;
-  }
-  ask(_choice->isOfTests() ? _kinds & elementsAndAttributes : _kinds);
-  _namesAreKnown = !_choice->needsContext() || !_run.contextHasDefaultNamespace();
 }
 
 void XQueryNodeTest::setTest() {
@@ -82,7 +56,7 @@ void XQueryNodeTest::setTest() {
 
 void XQueryNodeTest::setNameTest(const XQueryNameTest& test) {
   _name = test.boundName();
-  if (!_name && test.nameWithoutNamespace() && !_run.contextHasDefaultNamespace()) {
+  if (!_name && test.nameWithoutNamespace() && !_run->contextHasDefaultNamespace()) {
     _name = test.nameWithoutNamespace();
   }
   if (_name) {
@@ -124,12 +98,11 @@ void XQueryNodeTest::setKindTest(const XQueryTypeDeclaration& test) {
 }
 
 bool XQueryNodeTest::matchesFurther(const NSXMLNode* node) {
-  if (_choice) return _choice->accepts(*node, _namesAreKnown ? nullptr : &_run.context);
   const auto* nameTest = dyn_cast<XQueryNameTest>(_expr);
   if (!nameTest || !nameTest->isDeferred()) {
-    return XQueryAxisStep::isValid(node, _expr, _run.context);
+    return XQueryAxisStep::isValid(node, _expr, _run->context);
   }
-  _name = _run.nameForDeferredTest(*nameTest);
+  _name = _run->nameForDeferredTest(*nameTest);
   if (!_name) _kinds = 0;
   return _name && node->expandedName() == _name;
 }

@@ -6,19 +6,14 @@
 // keeps what fits, and the focus is what it was before the predicate was evaluated. Reaching an
 // engine limit is no such error and ends the evaluation.
 #include "Context/XQueryContextInternal.h"
-#include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryPath.h"
-#include "Expr/XQueryCallExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
-#include "Expr/XQueryReads.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
-
-#include <algorithm>
 
 namespace xquery {
 namespace {
@@ -80,32 +75,6 @@ bool keepNodes(std::vector<NSXMLNode*>& nodes, const XQueryExpr& predicate,
   return true;
 }
 
-// Whether the expression's value is never a number.
-bool answersTruth(const XQueryExpr* expr) {
-  const auto* list = dyn_cast<XQueryExprList>(expr);
-  while (list && list->count() == 1) {
-    expr = list->objectAtIndex(0);
-    list = dyn_cast<XQueryExprList>(expr);
-  }
-  if (const auto* call = dyn_cast<XQueryCallExpr>(expr)) return call->answersTruth();
-  if (const auto* path = dyn_cast<XQueryPathExpr>(expr)) {
-    const XQueryStep* last = path->step();
-    while (last && last->next()) last = last->next();
-    return isa<XQueryAxisStep>(last);
-  }
-  const auto* operation = dyn_cast<XQueryOperatorExpr>(expr);
-  if (!operation) return false;
-  switch (XQueryOperatorExpr::operatorClassification(operation->operatorType())) {
-    case 1:  // logical
-    case 5:  // value comparison
-    case 6:  // general comparison
-    case 7:  // node comparison
-      return true;
-    default:
-      return false;
-  }
-}
-
 }  // namespace
 
 bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t position,
@@ -123,29 +92,10 @@ bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t posi
   return false;
 }
 
-bool XQueryStep::keepsByAll(NSObject* item, int64_t position, XQueryContext& context) const {
-  return std::all_of(_predicates.begin(), _predicates.end(), [&](const auto& predicate) {
-    return keeps(*predicate, item, position, context);
-  });
-}
-
 std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicate) {
   const XQueryLiteral* literal = literalIn(predicate);
   if (!literal || !XQueryIsNumericType(literal->literalValue().get())) return std::nullopt;
   return cast<NSNumber>(literal->literalValue())->unsignedIntegerValue();
-}
-
-bool XQueryStep::loadsDocuments() const {
-  return std::any_of(firstPredicate(), _predicates.end(), [](const auto& predicate) {
-    return predicate && XQueryReadsOf(*predicate).loads;
-  });
-}
-
-bool XQueryStep::hasPredicatesOfTruth() const {
-  const bool areOfTruth =
-      std::all_of(firstPredicate(), _predicates.end(),
-                  [](const auto& predicate) { return predicate && answersTruth(predicate.get()); });
-  return areOfTruth && !loadsDocuments();
 }
 
 Value XQueryStep::handlePreicatesFromIndex(size_t index, Value items,

@@ -1,7 +1,6 @@
 #include "Plan/Joins/XQueryInnerKeys.h"
 
 #include "Context/XQueryContextInternal.h"
-#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
 
@@ -15,7 +14,7 @@ Value XQueryInnerKeys::computeValue(XQueryContext& context) const {
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
   std::vector<Value> nodes;
-  if (!cast<XQueryPathExpr>(&plain())->listNodesBefore(_step, context, nodes)) return {};
+  if (!_path->listNodesBefore(_step, context, nodes)) return {};
   XQueryGatherer keys;
   for (const Value& node : nodes) {
     checkWork();

@@ -3,18 +3,17 @@
 #pragma once
 
 #include "Plan/Operators/XQueryPlannedExpr.h"
+#include "Plan/Paths/XQueryWalkedPath.h"
 
 #include <utility>
 
 namespace xquery {
 
-class XQueryStep;
-
 class XQueryInnerKeys : public XQueryPlannedExpr {
  public:
-  // `path` is an XQueryPathExpr that ends with the step; `key` is read from each of the nodes that
+  // `path` ends with the step; `key` is read from each of the nodes that
   // the step's predicates are asked for.
-  [[nodiscard]] static Ref<XQueryInnerKeys> exprWithPath(Ref<XQueryExpr> path,
+  [[nodiscard]] static Ref<XQueryInnerKeys> exprWithPath(Ref<XQueryWalkedPath> path,
                                                          const XQueryStep& step,
                                                          Ref<XQueryExpr> key) {
     return make<XQueryInnerKeys>(std::move(path), step, std::move(key));
@@ -24,12 +23,13 @@ class XQueryInnerKeys : public XQueryPlannedExpr {
   Value computeValue(XQueryContext& context) const override;
 
  protected:
-  XQueryInnerKeys(Ref<XQueryExpr> path, const XQueryStep& step, Ref<XQueryExpr> key)
-      : XQueryPlannedExpr(std::move(path)), _step(step), _key(std::move(key)) {}
+  XQueryInnerKeys(Ref<XQueryWalkedPath> path, const XQueryStep& step, Ref<XQueryExpr> key)
+      : XQueryPlannedExpr(path), _path(std::move(path)), _step(step), _key(std::move(key)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
+  const Ref<XQueryWalkedPath> _path;
   const XQueryStep& _step;
   const Ref<XQueryExpr> _key;
 };

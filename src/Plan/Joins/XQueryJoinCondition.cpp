@@ -10,6 +10,7 @@
 #include "Plan/Joins/XQueryInnerKeys.h"
 #include "Plan/Joins/XQueryJoinedSteps.h"
 #include "Plan/Joins/XQueryPartOfCall.h"
+#include "Plan/Rules/PathAt.h"
 #include "Prolog/XQueryDeclarations.h"
 
 #include <algorithm>
@@ -240,43 +241,39 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfSome(XQueryPlaceID pl
 
 // "buyer[@person = ...]", which is true when there is such a node: a key for each buyer.
 XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfPath(XQueryPlaceID place) const {
-  const auto* path = cast<XQueryPathExpr>(at(place).expr);
-  const XQueryStep* step = path->step();
+  XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, place);
+  if (!path || path->steps().empty()) return {};
   XQueryFacts pathFacts;
-  if (!step) return {};
-  if (isa<XQueryAxisStep>(step)) {
+  if (!path->start()) {
     pathFacts.deeds |= XQueryDeeds::ReadsItem;
   } else {
     const XQueryPlaceID start = _planning.program.part(place, XQueryRole::FirstStep);
-    if (start == XQueryNoPlace || !step->predicates().empty()) return {};
+    if (start == XQueryNoPlace || !path->start()->predicates().empty()) return {};
     pathFacts.addDeeds(facts(start));
-    step = step->next();
   }
-  const XQueryStep* last = nullptr;
-  for (const XQueryStep* each = step; each; each = each->next()) {
-    const auto* axisStep = dyn_cast<XQueryAxisStep>(each);
-    if (!axisStep || axisStep->testMayRaise()) return {};
-    if (each->next() && !each->predicates().empty()) return {};
-    last = each;
+  const XQueryWalkedStep& last = path->steps().back();
+  for (const XQueryWalkedStep& each : path->steps()) {
+    if (each.isExpression() || each.testMayRaise) return {};
+    if (&each != &last && !each.step->predicates().empty()) return {};
   }
-  if (!last || last->predicates().size() != 1) return {};
-  const auto places = XQueryPredicatesOf(_planning, place, *last);
-  if (!XQueryPredicatesAreOfTruth(_planning, *last, places)) return {};
+  if (last.step->predicates().size() != 1) return {};
+  const auto places = XQueryPredicatesOf(_planning, place, last);
+  if (!XQueryPredicatesAreOfTruth(_planning, places)) return {};
   const auto all = conjuncts(places.front());
   if (all.empty()) return {};
   XQueryJoinScope inner;
   inner.isFocus = true;
   Comparison found = operandsAt(all.front(), inner);
   if (!found.key || found.relation.isValueComparison) return {};
-  pathFacts.addDeeds(XQueryFactsUpTo(_planning, place, *step, *last));
+  pathFacts.addDeeds(XQueryFactsUpTo(_planning, place, *path, last));
   pathFacts.addDeedsWithin(found.keyFacts);
   found.isWhole = all.size() == 1;
-  found.key = XQueryInnerKeys::exprWithPath(Ref<XQueryExpr>(at(place).expr), *last, found.key);
+  found.key = XQueryInnerKeys::exprWithPath(Ref<XQueryWalkedPath>(path), *last.step, found.key);
   found.keyFacts = pathFacts;
   const XQueryJoinReads reads = _scope.readsOf(pathFacts);
   const XQueryJoinReads others = _scope.readsOf(found.probeFacts);
   if (reads == XQueryJoinReads::Round && others == XQueryJoinReads::Item) {
-    if (!areOfRound(*path, pathFacts)) return {};
+    if (!areOfRound(path->path(), pathFacts)) return {};
     std::swap(found.key, found.probe);
     std::swap(found.keyFacts, found.probeFacts);
     found.relation.relation = XQueryMirrored(found.relation.relation);

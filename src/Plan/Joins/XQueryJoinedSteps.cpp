@@ -1,6 +1,6 @@
 #include "Plan/Joins/XQueryJoinedSteps.h"
 
-#include "Expr/Paths/XQueryPath.h"
+#include "Plan/Paths/XQueryWalkedPath.h"
 
 #include <algorithm>
 
@@ -14,26 +14,26 @@ bool staysInside(int axis) {
 }  // namespace
 
 std::vector<XQueryPlaceID> XQueryPredicatesOf(const XQueryPlanning& planning, XQueryPlaceID path,
-                                              const XQueryStep& step) {
+                                              const XQueryStep& step, size_t first) {
   std::vector<XQueryPlaceID> places;
   for (XQueryPlaceID part = planning.program.firstPart(path); part != XQueryNoPlace;
        part = planning.program.nextPart(part)) {
     const XQueryPlace& at = planning.program[part];
     if (at.step == &step && at.role == XQueryRole::Predicate) places.push_back(part);
   }
-  // Those that have become part of the test come first.
-  places.erase(places.begin(), places.begin() + static_cast<std::ptrdiff_t>(std::min(
-                                                    places.size(), step.predicatesInTest())));
+  if (places.size() != step.predicates().size()) return {};
+  places.erase(places.begin(), places.begin() + static_cast<std::ptrdiff_t>(first));
   return places;
 }
 
-bool XQueryPredicatesAreKnown(const XQueryStep& step, const std::vector<XQueryPlaceID>& places) {
-  return places.size() + step.predicatesInTest() == step.predicates().size();
+std::vector<XQueryPlaceID> XQueryPredicatesOf(const XQueryPlanning& planning, XQueryPlaceID path,
+                                              const XQueryWalkedStep& step) {
+  return XQueryPredicatesOf(planning, path, *step.step, step.predicatesInTest);
 }
 
-bool XQueryPredicatesAreOfTruth(const XQueryPlanning& planning, const XQueryStep& step,
+bool XQueryPredicatesAreOfTruth(const XQueryPlanning& planning,
                                 const std::vector<XQueryPlaceID>& places) {
-  if (places.empty() || !XQueryPredicatesAreKnown(step, places)) return false;
+  if (places.empty()) return false;
   return std::all_of(places.begin(), places.end(), [&](XQueryPlaceID place) {
     using namespace XQueryDeeds;
     const XQueryFacts& facts = planning.facts[place];
@@ -43,16 +43,17 @@ bool XQueryPredicatesAreOfTruth(const XQueryPlanning& planning, const XQueryStep
   });
 }
 
-XQueryFacts XQueryFactsUpTo(const XQueryPlanning& planning, XQueryPlaceID path,
-                            const XQueryStep& first, const XQueryStep& end) {
+XQueryFacts XQueryFactsUpTo(const XQueryPlanning& planning, XQueryPlaceID place,
+                            const XQueryWalkedPath& path, const XQueryWalkedStep& end) {
   XQueryFacts facts;
-  for (const XQueryStep* step = &first;; step = step->next()) {
-    if (!staysInside(cast<XQueryAxisStep>(step)->axis())) facts.deeds |= XQueryDeeds::ReadsOutside;
-    if (step == &end) return facts;
-    const auto places = XQueryPredicatesOf(planning, path, *step);
-    if (!XQueryPredicatesAreKnown(*step, places)) facts.deeds |= XQueryDeeds::IsUnrepeatable;
-    for (const XQueryPlaceID place : places) facts.addDeedsWithin(planning.facts[place]);
+  for (const XQueryWalkedStep& step : path.steps()) {
+    if (!staysInside(step.axis)) facts.deeds |= XQueryDeeds::ReadsOutside;
+    if (&step == &end) break;
+    const auto places = XQueryPredicatesOf(planning, place, step);
+    if (places.empty() && step.hasPredicates()) facts.deeds |= XQueryDeeds::IsUnrepeatable;
+    for (const XQueryPlaceID each : places) facts.addDeedsWithin(planning.facts[each]);
   }
+  return facts;
 }
 
 }  // namespace xquery

@@ -3,23 +3,28 @@
 
 #include "Plan/Planning.h"
 
+#include <cstddef>
 #include <vector>
 
 namespace xquery {
 
 class XQueryStep;
+class XQueryWalkedPath;
+struct XQueryWalkedStep;
 
-// The places of the step's predicates that its test does not ask for already.
+// The places of the step's predicates, without the first so many, or empty where they are not all
+// known.
 std::vector<XQueryPlaceID> XQueryPredicatesOf(const XQueryPlanning& planning, XQueryPlaceID path,
-                                              const XQueryStep& step);
-// Whether these are all there are: places refer to the steps of a path as it was written.
-bool XQueryPredicatesAreKnown(const XQueryStep& step, const std::vector<XQueryPlaceID>& places);
+                                              const XQueryStep& step, size_t first);
+// The same without those that its test asks for already.
+std::vector<XQueryPlaceID> XQueryPredicatesOf(const XQueryPlanning& planning, XQueryPlaceID path,
+                                              const XQueryWalkedStep& step);
 // Whether they, of which there are some, can be asked in any order, of each item by itself.
-bool XQueryPredicatesAreOfTruth(const XQueryPlanning& planning, const XQueryStep& step,
+bool XQueryPredicatesAreOfTruth(const XQueryPlanning& planning,
                                 const std::vector<XQueryPlaceID>& places);
 // What finding the nodes of a step reads and does, from the first axis step on: all but its own
-// predicates.
-XQueryFacts XQueryFactsUpTo(const XQueryPlanning& planning, XQueryPlaceID path,
-                            const XQueryStep& first, const XQueryStep& end);
+// predicates. There are none but axis steps up to it.
+XQueryFacts XQueryFactsUpTo(const XQueryPlanning& planning, XQueryPlaceID place,
+                            const XQueryWalkedPath& path, const XQueryWalkedStep& end);
 
 }  // namespace xquery

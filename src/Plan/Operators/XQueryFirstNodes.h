@@ -1,8 +1,8 @@
 // A path of whose nodes only the first ones are asked for, by who stands around it.
 #pragma once
 
-#include "Expr/Paths/XQueryPath.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
+#include "Plan/Paths/XQueryWalkedPath.h"
 
 #include <cstdint>
 #include <utility>
@@ -12,7 +12,7 @@ namespace xquery {
 class XQueryFirstNodes : public XQueryPlannedExpr {
  public:
   // The path findsInOrder.
-  [[nodiscard]] static Ref<XQueryFirstNodes> exprWithPlain(Ref<XQueryPathExpr> path,
+  [[nodiscard]] static Ref<XQueryFirstNodes> exprWithPlain(Ref<XQueryWalkedPath> path,
                                                            uint64_t most) {
     return make<XQueryFirstNodes>(std::move(path), most);
   }
@@ -21,13 +21,13 @@ class XQueryFirstNodes : public XQueryPlannedExpr {
   Value computeValue(XQueryContext& context) const override;
 
  protected:
-  XQueryFirstNodes(Ref<XQueryPathExpr> path, uint64_t most)
+  XQueryFirstNodes(Ref<XQueryWalkedPath> path, uint64_t most)
       : XQueryPlannedExpr(path), _path(std::move(path)), _most(most) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
-  const Ref<XQueryPathExpr> _path;
+  const Ref<XQueryWalkedPath> _path;
   const uint64_t _most;
 };
 

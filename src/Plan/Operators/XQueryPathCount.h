@@ -2,8 +2,8 @@
 // "exists(P)", "empty(P)", "not(P)", "count(P) > 2", P itself where its truth is asked for.
 #pragma once
 
-#include "Expr/Paths/XQueryPath.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
+#include "Plan/Paths/XQueryWalkedPath.h"
 
 #include <cstdint>
 #include <utility>
@@ -21,7 +21,7 @@ class XQueryPathCount : public XQueryPlannedExpr {
 
   // The path countsNodes and is part of the plain expression, or that itself.
   [[nodiscard]] static Ref<XQueryPathCount> exprWithPlain(Ref<XQueryExpr> plain,
-                                                          Ref<XQueryPathExpr> path,
+                                                          Ref<XQueryWalkedPath> path,
                                                           Question question) {
     return make<XQueryPathCount>(std::move(plain), std::move(path), question);
   }
@@ -30,13 +30,13 @@ class XQueryPathCount : public XQueryPlannedExpr {
   Value computeValue(XQueryContext& context) const override;
 
  protected:
-  XQueryPathCount(Ref<XQueryExpr> plain, Ref<XQueryPathExpr> path, Question question)
+  XQueryPathCount(Ref<XQueryExpr> plain, Ref<XQueryWalkedPath> path, Question question)
       : XQueryPlannedExpr(std::move(plain)), _path(std::move(path)), _question(question) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
-  const Ref<XQueryPathExpr> _path;
+  const Ref<XQueryWalkedPath> _path;
   const Question _question;
 };
 

@@ -12,11 +12,15 @@
 
 namespace xquery {
 
+class XQueryWalkedPath;
+
 class XQueryPlannedExpr : public XQueryExpr {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::PlannedExpr; }
 
   const XQueryExpr& plain() const { return *_plain; }
+  // Itself, where it is one.
+  virtual const XQueryWalkedPath* walkedPath() const { return nullptr; }
   // What it stands for has been bound.
   void bindInfoForProlog(XQueryProlog&) override {}
   void visitParts(XQueryPartVisitor& visitor) override {

@@ -4,12 +4,13 @@
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
+#include "Plan/Paths/XQueryWalkedPath.h"
 
 namespace xquery {
 
 bool XQueryShortWalk::readFrom(const XQueryExpr& expr) {
   const XQueryExpr* origin = XQueryWithoutParentheses(&expr);
-  if (const auto* path = dyn_cast<XQueryPathExpr>(origin)) {
+  if (const auto* path = XQueryPathIn(origin)) {
     const XQueryStep* step = path->step();
     origin = nullptr;
     if (step && step->kind() == Kind::FilterStep && step->predicates().empty()) {
@@ -30,7 +31,7 @@ bool XQueryShortWalk::readFrom(const XQueryExpr& expr) {
 }
 
 bool XQueryShortWalk::readStep(const XQueryAxisStep& step) {
-  if (_count == mostSteps || !step.predicates().empty() || step.choice()) return false;
+  if (_count == mostSteps || !step.predicates().empty()) return false;
   // A parent comes first, so that there is one of them.
   const bool isLeading = _count == 0 || _steps[_count - 1].axis == XQueryAxisParent;
   const bool isOpen = step.axis() == XQueryAxisChild || step.axis() == XQueryAxisAttribute ||

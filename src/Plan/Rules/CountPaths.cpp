@@ -5,17 +5,17 @@
 //             "or"
 // Facts       P is a path whose last step is an axis step, all of whose tests and predicates can be
 //             repeated and cannot fail once the first step is evaluated
-//             (XQueryPathExpr::countsNodes)
+//             (XQueryWalkedPath::countsNodes)
 // Operator    XQueryPathCount: no list is made, and the walk ends as soon as the answer is certain
 // Why         what is not walked could only have found more nodes; the truth of nodes is that there
 //             are any
 #include "Expr/Operators/XQueryOperatorExpr.h"
-#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLists.h"
 #include "Functions/Boolean.h"
 #include "Functions/Sequence.h"
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Operators/XQueryPathCount.h"
+#include "Plan/Paths/XQueryWalkedPath.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 #include "Plan/Rules/PositionConditions.h"
@@ -29,9 +29,10 @@ namespace {
 using Question = XQueryPathCount::Question;
 
 // The path that counts its nodes, in parentheses or not; null for anything else.
-XQueryPathExpr* pathIn(const XQueryExpr* expr) {
-  const auto* path = dyn_cast<XQueryPathExpr>(XQueryWithoutParentheses(expr));
-  return path && path->countsNodes() ? const_cast<XQueryPathExpr*>(path) : nullptr;
+XQueryWalkedPath* pathIn(const XQueryExpr* expr) {
+  const auto* planned = dyn_cast<XQueryPlannedExpr>(XQueryWithoutParentheses(expr));
+  const XQueryWalkedPath* path = planned ? planned->walkedPath() : nullptr;
+  return path && path->countsNodes() ? const_cast<XQueryWalkedPath*>(path) : nullptr;
 }
 
 // Of a call with one argument.
@@ -90,10 +91,10 @@ class Search {
  private:
   const XQueryExpr* at(XQueryPlaceID place) const { return _planning.program[place].expr; }
 
-  bool wrap(XQueryPlaceID place, XQueryPathExpr* path, Question question) {
+  bool wrap(XQueryPlaceID place, XQueryWalkedPath* path, Question question) {
     if (!path) return false;
     _planning.wrap(place, XQueryPathCount::exprWithPlain(*_planning.program[place].slot,
-                                                         Ref<XQueryPathExpr>(path), question));
+                                                         Ref<XQueryWalkedPath>(path), question));
     return true;
   }
 
@@ -134,7 +135,7 @@ class Search {
   }
 
   void lookAtTruth(XQueryPlaceID place) {
-    if (isAskedForTruth(place)) wrap(place, pathIn(at(place)), {1, false});
+    if (isAskedForTruth(place)) wrap(place, pathIn(_planning.exprAt(place).get()), {1, false});
   }
 
   bool isAskedForTruth(XQueryPlaceID place) const {

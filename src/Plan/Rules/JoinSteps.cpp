@@ -12,11 +12,11 @@
 // Operator    XQueryJoin
 // Why         the items depend on what the path starts with; a result of a path holds each node
 //             once, in an order that does not depend on how it was found
-#include "Expr/Paths/XQueryPath.h"
 #include "Plan/Joins/XQueryJoin.h"
 #include "Plan/Joins/XQueryJoinedSteps.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/PathAt.h"
 
 #include <utility>
 #include <vector>
@@ -25,10 +25,10 @@ namespace xquery {
 namespace {
 
 // Of the predicates the one that joins best.
-XQueryJoinCondition conditionOf(const XQueryPlanning& planning, const XQueryStep& step,
+XQueryJoinCondition conditionOf(const XQueryPlanning& planning,
                                 const std::vector<XQueryPlaceID>& places) {
   XQueryJoinCondition best;
-  if (!XQueryPredicatesAreOfTruth(planning, step, places)) return best;
+  if (!XQueryPredicatesAreOfTruth(planning, places)) return best;
   XQueryJoinScope scope;
   scope.isFocus = true;
   const XQueryJoinSearch search(planning, scope, {});
@@ -47,26 +47,27 @@ bool isSettled(const XQueryFacts& facts) {
   return facts.isRepeatable() && !looksForGlobals && facts.reads.isEmpty();
 }
 
-void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryPathExpr& path) {
+void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryWalkedPath& path) {
   if (planning.showsLeftovers(planning.facts[place].assigns, place)) return;
-  const XQueryStep* firstAxisStep = nullptr;
-  for (const XQueryStep* step = path.step(); step; step = step->next()) {
-    const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
-    if (!axisStep && step != path.step()) return;
-    if (axisStep && axisStep->testMayRaise()) return;
-    if (axisStep && !firstAxisStep) firstAxisStep = step;
-    if (step->predicates().empty()) continue;
-    auto condition = conditionOf(planning, *step, XQueryPredicatesOf(planning, place, *step));
-    if (!condition.key) continue;
-    bool looksAround = false;
-    if (axisStep) {
-      if (step->next() && !isa<XQueryAxisStep>(step->next())) return;
-      const XQueryFacts facts = XQueryFactsUpTo(planning, place, *firstAxisStep, *step);
-      if (!isSettled(facts)) return;
-      looksAround = facts.does(XQueryDeeds::ReadsOutside);
+  if (const XQueryStep* start = path.start()) {
+    auto condition = conditionOf(planning, XQueryPredicatesOf(planning, place, *start, 0));
+    if (condition.key) {
+      planning.choose(place);
+      return path.setPicker(XQueryJoin::ofStep(path, std::move(condition), false), start);
     }
+  }
+  const auto& steps = path.steps();
+  for (size_t i = 0; i < steps.size(); ++i) {
+    if (steps[i].isExpression() || steps[i].testMayRaise) return;
+    auto condition = conditionOf(planning, XQueryPredicatesOf(planning, place, steps[i]));
+    if (!condition.key) continue;
+    if (i + 1 < steps.size() && steps[i + 1].isExpression()) return;
+    const XQueryFacts facts = XQueryFactsUpTo(planning, place, path, steps[i]);
+    if (!isSettled(facts)) return;
+    const bool looksAround = facts.does(XQueryDeeds::ReadsOutside);
     planning.choose(place);
-    return path.setPicker(XQueryJoin::ofStep(path, std::move(condition), looksAround), step);
+    return path.setPicker(XQueryJoin::ofStep(path, std::move(condition), looksAround),
+                          steps[i].step);
   }
 }
 
@@ -74,7 +75,8 @@ void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryPathExpr& pat
 
 void XQueryJoinSteps(XQueryPlanning& planning) {
   for (XQueryPlaceID place = 0; place < planning.program.placeCount(); ++place) {
-    auto* path = dyn_cast<XQueryPathExpr>(planning.program[place].expr);
+    if (planning.program[place].expr->kind() != Kind::PathExpr) continue;
+    XQueryWalkedPath* path = XQueryWalkedPathAt(planning, place);
     if (path) joinPath(planning, place, *path);
   }
 }

@@ -1,7 +1,7 @@
 // Conditions on the name of the context item: "name() = 'a'", "local-name(.) eq 'a'".
 #pragma once
 
-#include "Expr/Paths/XQueryNameChoice.h"
+#include "Plan/Paths/XQueryNameChoice.h"
 #include "xquery/String.h"
 
 #include <optional>

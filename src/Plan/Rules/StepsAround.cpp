@@ -1,25 +1,23 @@
 #include "Plan/Rules/StepsAround.h"
 
-#include "Expr/Paths/XQueryPath.h"
+#include "Plan/Paths/XQueryWalkedPath.h"
 #include "Plan/Planning.h"
 
 namespace xquery {
 
-bool XQueryHidesFocusOf(const XQueryStep& step, const XQueryPathExpr& path, XQueryPlaceID place,
+bool XQueryHidesFocusOf(const XQueryStep& step, const XQueryWalkedPath& path, XQueryPlaceID place,
                         const XQueryPlanning& planning) {
-  const XQueryStep* first = path.step();
-  if (!isa<XQueryAxisStep>(first) && !isa<XQueryRootStep>(first)) {
+  if (path.start() && !isa<XQueryRootStep>(path.start())) {
     const XQueryPlaceID start = planning.program.part(place, XQueryRole::FirstStep);
     if (start == XQueryNoPlace) return false;
     const XQueryFacts& items = planning.facts[start];
     if (!items.are(XQueryItems::Node) && items.most > 1) return false;
   }
-  bool isPassed = false;
-  for (const XQueryStep* each = first; each; each = each->next()) {
-    const auto* axisStep = dyn_cast<XQueryAxisStep>(each);
-    if (axisStep && axisStep->testMayRaise()) return false;
-    if (!axisStep && each != first && each != &step && !isPassed) return false;
-    isPassed = isPassed || each == &step;
+  bool isPassed = path.start() == &step;
+  for (const XQueryWalkedStep& each : path.steps()) {
+    if (each.testMayRaise) return false;
+    if (each.isExpression() && each.step != &step && !isPassed) return false;
+    isPassed = isPassed || each.step == &step;
   }
   return true;
 }

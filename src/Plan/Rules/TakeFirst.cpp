@@ -2,7 +2,7 @@
 //
 // Pattern     subsequence(P, 1, 3), (P)[1], (P)[position() <= 3], with any small numbers
 // Facts       P is a path that finds its nodes in document order from one node, and that can be
-//             walked in part (XQueryPathExpr::findsInOrder)
+//             walked in part (XQueryWalkedPath::findsInOrder)
 // Operator    XQueryFirstNodes for P: the walk ends at the last node that can be asked for
 // Why         what is behind that node cannot be told from what is not there, since the whole asks
 //             neither for it nor for the number of nodes
@@ -14,6 +14,7 @@
 #include "Plan/Operators/XQueryFirstNodes.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/PositionConditions.h"
 
@@ -74,13 +75,12 @@ class Search {
   void limit(XQueryPlaceID place, uint64_t most) {
     place = XQueryPlaceInside(_program, place);
     if (place == XQueryNoPlace || !_planning.isOpen(place)) return;
-    const auto* path = dyn_cast<XQueryPathExpr>(_program[place].expr);
+    XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, place);
     if (!path) return;
     if (!path->findsInOrder()) {
       return _planning.refuse(place, "its nodes may not come in document order as they are found");
     }
-    _planning.wrap(place, XQueryFirstNodes::exprWithPlain(
-                              Ref<XQueryPathExpr>(const_cast<XQueryPathExpr*>(path)), most));
+    _planning.wrap(place, XQueryFirstNodes::exprWithPlain(Ref<XQueryWalkedPath>(path), most));
   }
 
   XQueryPlanning& _planning;

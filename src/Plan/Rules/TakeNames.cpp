@@ -6,21 +6,21 @@
 // Facts       the test before the filter looks at kinds of nodes alone; the names can be resolved
 //             without an error; no expression behind it asks for the position that a node has
 //             among the others; nothing shows the focus that it leaves (StepsAround.h)
-// Operator    none: the step takes the choice of names into its test (XQueryAxisStep::setChoice)
+// Operator    none: the step takes the choice of names into its test (XQueryWalkedStep::setChoice)
 //             and so it is found in the index of the tree, below "//" as well
 // Why         all of these conditions look at the node alone and cannot fail; the children of a
 //             node that have one of two names are, in document order, the union of those that have
 //             the one and those that have the other; so are the results of whole paths from the
 //             document, where they are sorted
 #include "Expr/Operators/XQueryOperatorExpr.h"
-#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLists.h"
+#include "Plan/Paths/XQueryWalkedPath.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 #include "Plan/Rules/NameConditions.h"
+#include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/StepsAround.h"
 
-#include <memory>
 #include <vector>
 
 namespace xquery {
@@ -28,9 +28,9 @@ namespace {
 
 // The only step of a path that consists of a name test; null for anything else.
 const XQueryAxisStep* nameStepIn(const XQueryExpr* expr) {
-  const auto* path = dyn_cast<XQueryPathExpr>(XQueryWithoutParentheses(expr));
+  const auto* path = XQueryPathIn(XQueryWithoutParentheses(expr));
   const auto* step = path ? dyn_cast<XQueryAxisStep>(path->step()) : nullptr;
-  const bool fits = step && !step->next() && step->predicates().empty() && !step->choice() &&
+  const bool fits = step && !step->next() && step->predicates().empty() &&
                     isa<XQueryNameTest>(step->expr()) && !step->testMayRaise();
   return fits ? step : nullptr;
 }
@@ -103,7 +103,7 @@ bool isUnion(const XQueryExpr& expr) {
 }
 
 bool isChildOfName(const XQueryAxisStep& step) {
-  return step.axis() == XQueryAxisChild && step.predicates().empty() && !step.choice() &&
+  return step.axis() == XQueryAxisChild && step.predicates().empty() &&
          isa<XQueryNameTest>(step.expr()) && !step.testMayRaise();
 }
 
@@ -114,7 +114,8 @@ const XQueryAxisStep* lastNameFromRoot(const XQueryPathExpr& path) {
   const XQueryAxisStep* last = nullptr;
   for (const XQueryStep* each = path.step()->next(); each; each = each->next()) {
     last = dyn_cast<XQueryAxisStep>(each);
-    if (!last || (!isChildOfName(*last) && !last->isDescendantShorthand())) return nullptr;
+    if (!last || (!isChildOfName(*last) && !XQueryWalkedStep(*last).isDescendantShorthand()))
+      return nullptr;
   }
   return last && isChildOfName(*last) ? last : nullptr;
 }
@@ -141,25 +142,26 @@ class Search {
     for (XQueryPlaceID place = 0; place < _planning.program.placeCount(); ++place) {
       if (!_planning.isOpen(place)) continue;
       const XQueryExpr& expr = *_planning.program[place].expr;
-      if (isUnion(expr)) takeUnionOfPaths(place);
-      if (isa<XQueryPathExpr>(&expr)) {
-        lookAt(place, *cast<XQueryPathExpr>(_planning.program[place].expr));
+      if (isUnion(expr)) {
+        takeUnionOfPaths(place);
+      } else if (isa<XQueryPathExpr>(&expr)) {
+        if (XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, place)) lookAt(place, *path);
       }
     }
   }
 
  private:
-  void lookAt(XQueryPlaceID place, XQueryPathExpr& path) {
-    bool hasChanged = false;
-    XQueryStep* previous = nullptr;
-    for (XQueryStep* step = path.step(); step; previous = step, step = step->next()) {
-      if (auto* axisStep = dyn_cast<XQueryAxisStep>(step)) {
-        hasChanged = takeFilter(place, path, *axisStep) || hasChanged;
-      } else if (isa<XQueryAxisStep>(previous) && takeUnion(place, path, *previous, *step)) {
-        step = previous->next();
+  void lookAt(XQueryPlaceID place, XQueryWalkedPath& path) {
+    auto& steps = path.changeableSteps();
+    for (size_t i = 0; i < steps.size(); ++i) {
+      // An expression behind it counts the nodes that are left.
+      if (i + 1 < steps.size() && steps[i + 1].isExpression()) continue;
+      if (!steps[i].isExpression()) {
+        takeFilter(place, path, steps[i]);
+      } else if (i > 0 && !steps[i - 1].isExpression()) {
+        takeUnion(place, path, steps[i]);
       }
     }
-    if (hasChanged) path.noteChange();
   }
 
   // The place of a step's part in that role.
@@ -172,76 +174,59 @@ class Search {
     return part;
   }
 
-  bool takeFilter(XQueryPlaceID path, const XQueryPathExpr& expr, XQueryAxisStep& step) {
-    // An expression behind it counts the nodes that are left.
-    if (step.next() && !isa<XQueryAxisStep>(step.next())) return false;
-    if (step.choice() || !asksForKindAlone(step.expr()) || step.predicates().empty()) return false;
-    const XQueryPlaceID place = partOf(path, step, XQueryRole::Predicate);
-    if (place == XQueryNoPlace || !_planning.isOpen(place)) return false;
+  void takeFilter(XQueryPlaceID path, const XQueryWalkedPath& walk, XQueryWalkedStep& step) {
+    if (!asksForKindAlone(step.test) || step.step->predicates().empty()) return;
+    const XQueryPlaceID place = partOf(path, *step.step, XQueryRole::Predicate);
+    if (place == XQueryNoPlace || !_planning.isOpen(place)) return;
     XQueryNameChoice names = namesAskedFor(*_planning.program[place].expr);
-    if (names.isEmpty()) return false;
-    if (!XQueryHidesFocusOf(step, expr, path, _planning)) return refuse(place);
-    step.setChoice(std::make_unique<const XQueryNameChoice>(std::move(names)), 1);
+    if (names.isEmpty()) return;
+    if (!XQueryHidesFocusOf(*step.step, walk, path, _planning)) return refuse(place);
+    step.setChoice(std::move(names), 1);
     _planning.leaveOut(place);
     _planning.choose(place, "it is part of the test of the step");
-    return true;
   }
 
-  bool takeUnion(XQueryPlaceID path, XQueryPathExpr& expr, XQueryStep& previous,
-                 const XQueryStep& step) {
-    if (step.next() && !isa<XQueryAxisStep>(step.next())) return false;
-    const XQueryPlaceID place = partOf(path, step, XQueryRole::Step);
-    if (place == XQueryNoPlace || !_planning.isOpen(place)) return false;
+  void takeUnion(XQueryPlaceID path, const XQueryWalkedPath& walk, XQueryWalkedStep& step) {
+    const XQueryPlaceID place = partOf(path, *step.step, XQueryRole::Step);
+    if (place == XQueryNoPlace || !_planning.isOpen(place)) return;
     int axis = 0;
-    auto names = std::make_unique<XQueryNameChoice>();
+    XQueryNameChoice names;
     const auto add = [&](const XQueryExpr& operand) {
       const XQueryAxisStep* found = nameStepIn(&operand);
       if (!found || (axis != 0 && found->axis() != axis)) return false;
       axis = found->axis();
-      names->addTest(testOf(*found));
+      names.addTest(testOf(*found));
       return axis == XQueryAxisChild || axis == XQueryAxisAttribute;
     };
-    if (!forEachOperand(_planning.program[place].expr, isUnion, add)) return false;
-    if (!XQueryHidesFocusOf(step, expr, path, _planning)) return refuse(place);
-    auto by =
-        XQueryAxisStep::axisStepWithAxis(axis, XQueryWildCardNameTest::nameTest(nullptr, nullptr));
-    by->setChoice(std::move(names), 0);
+    if (!forEachOperand(_planning.program[place].expr, isUnion, add)) return;
+    if (!XQueryHidesFocusOf(*step.step, walk, path, _planning)) return refuse(place);
+    step.becomeAxisStep(axis, std::move(names));
     _planning.leaveOut(place);
     _planning.choose(place, "one step with several names");
-    _planning.program.keep(expr.replaceStepBehind(previous, by));
-    return true;
   }
 
-  bool refuse(XQueryPlaceID place) {
+  void refuse(XQueryPlaceID place) {
     _planning.refuse(place, "an error that comes up later may show the focus that it leaves");
-    return false;
   }
 
   // The first path takes the names of the others.
   void takeUnionOfPaths(XQueryPlaceID place) {
     if (!_planning.program[place].isOrdered) return;
-    XQueryPathExpr* first = nullptr;
-    const XQueryAxisStep* firstName = nullptr;
-    auto names = std::make_unique<XQueryNameChoice>();
+    const XQueryPathExpr* first = nullptr;
+    XQueryNameChoice names;
     const auto add = [&](const XQueryExpr& operand) {
-      const auto* path = dyn_cast<XQueryPathExpr>(&operand);
+      const XQueryPathExpr* path = XQueryPathIn(&operand);
       const XQueryAxisStep* name = path ? lastNameFromRoot(*path) : nullptr;
       if (!name || (first && !leadAlike(*first, *path))) return false;
-      if (!first) {
-        first = const_cast<XQueryPathExpr*>(path);
-        firstName = name;
-      }
-      names->addTest(testOf(*name));
+      if (!first) first = path;
+      names.addTest(testOf(*name));
       return true;
     };
     if (!forEachOperand(_planning.program[place].expr, isUnion, add)) return;
-    auto by = XQueryAxisStep::axisStepWithAxis(XQueryAxisChild,
-                                               XQueryWildCardNameTest::nameTest(nullptr, nullptr));
-    by->setChoice(std::move(names), 0);
-    XQueryStep* previous = first->step();
-    while (previous->next() != firstName) previous = previous->next();
-    _planning.program.keep(first->replaceStepBehind(*previous, by));
-    _planning.replace(place, Ref<XQueryExpr>(first), "one path whose last step has several names");
+    auto by = XQueryWalkedPath::exprWithPlain(
+        _planning.exprAt(place), Ref<XQueryPathExpr>(const_cast<XQueryPathExpr*>(first)));
+    by->changeableSteps().back().becomeAxisStep(XQueryAxisChild, std::move(names));
+    _planning.replace(place, std::move(by), "one path whose last step has several names");
   }
 
   XQueryPlanning& _planning;

@@ -6,10 +6,10 @@
 // Operator    none: the predicate is the number, so that the step walks no further than that
 // Why         a number in a predicate asks for that position
 #include "Expr/Operators/XQueryOperatorExpr.h"
-#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/PositionConditions.h"
 #include "Plan/Rules/StepsAround.h"
 #include "Types/XQueryNumber.h"
@@ -20,7 +20,8 @@ void XQueryTakePositions(XQueryPlanning& planning) {
   for (XQueryPlaceID place = 0; place < planning.program.placeCount(); ++place) {
     const XQueryPlace& here = planning.program[place];
     if (here.role != XQueryRole::Predicate || !planning.isOpen(place)) continue;
-    auto* path = dyn_cast<XQueryPathExpr>(planning.program[here.parent].expr);
+    const XQueryWalkedPath* path =
+        here.parent == XQueryNoPlace ? nullptr : XQueryWalkedPathAt(planning, here.parent);
     const auto asked = XQueryPositionConditionIn(*here.expr);
     const bool isEqual = asked && (asked->comparison == XQueryOperatorEqual ||
                                    asked->comparison == XQueryOperatorEq);
@@ -29,7 +30,7 @@ void XQueryTakePositions(XQueryPlanning& planning) {
     auto number = XQueryLiteral::literalWithValue(XQueryNumber::integerWithInt64(asked->number));
     number->setExprLine(here.expr->exprLine());
     planning.replace(place, std::move(number));
-    path->noteChange();
+    const_cast<XQueryPathExpr&>(path->path()).notePositions();
   }
 }
 

@@ -28,7 +28,7 @@
 #pragma once
 
 #include "Expr/Paths/IdentitySet.h"
-#include "Expr/Paths/XQueryAxisWalk.h"
+#include "Plan/Paths/XQueryIndexedWalk.h"
 #include "xquery/XMLNode.h"
 
 #include <memory>

@@ -1,6 +1,6 @@
-#include "Expr/Paths/XQueryAxisTrail.h"
+#include "Expr/Paths/PathReference.h"
 #include "Functions/FunctionsTesting.h"
-#include "PathReference.h"
+#include "Plan/Paths/XQueryAxisTrail.h"
 
 #include <set>
 

@@ -1,4 +1,4 @@
-#include "Expr/Paths/XQueryNameChoice.h"
+#include "Plan/Paths/XQueryNameChoice.h"
 
 #include "Platform/Tree/Names.h"
 
@@ -47,16 +47,6 @@ bool XQueryNameChoice::accepts(const NSXMLNode& node, XQueryContext* context) co
     }
   }
   return false;
-}
-
-Ref<NSString> XQueryNameChoice::description() const {
-  NSMutableString text;
-  for (const Alternative& each : _alternatives) {
-    text.appendASCII(&each == &_alternatives.front() ? "(" : " | ");
-    text.append((each.test ? each.test->name() : each.text)->view());
-  }
-  text.appendASCII(")");
-  return text.string();
 }
 
 bool XQueryNameChoice::mayTake(const NSXMLExpandedName& name) const {

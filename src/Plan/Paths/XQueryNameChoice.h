@@ -1,8 +1,8 @@
 // The names that a step takes where it takes several, or where a predicate says which: the step
 // "(a | b)", and "*[self::a or self::b]", "*[name() = ('a', 'b')]", "*[local-name() = 'a']".
 //
-// A planner gives a step its choice (XQueryAxisStep::setChoice); what the query says in its place
-// is evaluated no more.
+// A rule gives a step its choice (XQueryWalkedStep); what the query says in its place is evaluated
+// no more.
 #pragma once
 
 #include "Expr/Paths/XQueryNameTest.h"
@@ -43,9 +43,6 @@ class XQueryNameChoice final : public NSXMLNameSelection {
   // Whether the names depend on the namespaces of the context: of one with a default namespace.
   bool needsContext() const;
   bool accepts(const NSXMLNode& node, XQueryContext* context) const;
-
-  // As a step would be written: "(a | b)".
-  Ref<NSString> description() const;
 
   // For an index, where no context is needed.
   bool mayTake(const NSXMLExpandedName& name) const override;

@@ -1,0 +1,230 @@
+#include "Plan/Paths/XQueryPathWalk.h"
+
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Paths/XQueryPathResults.h"
+#include "Expr/XQuerySequence.h"
+#include "Plan/Paths/XQueryIndexedWalk.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "Types/XQueryErrors.h"
+
+namespace xquery {
+namespace {
+
+// Whether the node's descendant axis ends where its subtree ends.
+bool descendantsAreSubtree(const NSXMLNode* node) {
+  if (node->kind() != Kind::Element && node->kind() != Kind::Document) return false;
+  // Without a node to stop at the walk goes to the end of the document, which is the end of the
+  // subtree of the topmost node and of its last child.
+  return XQueryDescendantStop(node) || !node->parent() || !node->parent()->parent();
+}
+
+}  // namespace
+
+XQueryAxisTrail& XQueryPathWalk::trail(size_t index) {
+  if (_trails.empty()) _trails.resize(_trailCount);
+  Trail& found = _trails[index];
+  if (found.changeCount != NSXMLTree::changeCount()) {
+    found.trail = XQueryAxisTrail();
+    found.changeCount = NSXMLTree::changeCount();
+  }
+  return found.trail;
+}
+
+void XQueryPathWalk::takeValue(size_t index, const Value& items, bool validate) {
+  const XQueryItemList list(items.get());
+  if (index == _steps.size()) return results.add(items.get(), context);
+  const bool isExpression = _steps[index].isExpression();
+  if (isExpression) context._internal().setLast(static_cast<int64_t>(list.count()));
+  for (size_t i = 0; i < list.count(); ++i) {
+    if (isExpression) {
+      takeItem(index, list[i], static_cast<int64_t>(i) + 1, validate);
+    } else if (auto* node = dyn_cast<NSXMLNode>(list[i])) {
+      takeNode(index, node);
+    } else if (validate) {
+      context._internal().raise(XQueryErrors::contextItemNotANode.error());
+    }
+    if (isOver()) return;
+  }
+}
+
+void XQueryPathWalk::takeNodes(size_t index, std::span<NSXMLNode* const> nodes) {
+  const bool isExpression = index < _steps.size() && _steps[index].isExpression();
+  if (isExpression) context._internal().setLast(static_cast<int64_t>(nodes.size()));
+  WorkPacer pacer;
+  int64_t position = 0;
+  for (NSXMLNode* node : nodes) {
+    ++position;
+    if (index == _steps.size()) {
+      pacer.turn();
+      results.addNode(node, context);
+    } else if (isExpression) {
+      takeItem(index, node, position, false);
+    } else {
+      takeNode(index, node);
+    }
+    if (isOver()) return;
+  }
+}
+
+void XQueryPathWalk::takeNode(size_t index, NSXMLNode* node) {
+  if (index == _steps.size()) return results.addNode(node, context);
+  const XQueryWalkedStep& step = _steps[index];
+  if (step.isExpression()) {
+    context._internal().setLast(1);
+    return takeItem(index, node, 1, false);
+  }
+  XQueryCheckStack(context);
+  if (setsEveryFocus || step.testMayRaise) context._internal().setContextItem(node, 0);
+  if (absorbsNext(step, node)) {
+    const bool isChild = _steps[index + 1].axis == XQueryAxisChild;
+    take(index + 1, isChild ? XQueryAxisDescendant : XQueryAxisAttributesBelow, node);
+  } else {
+    take(index, step.axis, node);
+  }
+}
+
+void XQueryPathWalk::takeItem(size_t index, NSObject* item, int64_t position, bool validate) {
+  const auto* step = cast<XQueryFilterStep>(_steps[index].step);
+  const Value value = step->valueFor(item, position, context);
+  if (XQueryHasFailed(value, context)) {
+    hasFailed = true;
+  } else {
+    takeValue(index + 1, value, validate);
+  }
+}
+
+bool XQueryPathWalk::absorbsNext(const XQueryWalkedStep& step, const NSXMLNode* node) const {
+  return step.absorbsNext && orderIsFree && !setsEveryFocus && descendantsAreSubtree(node);
+}
+
+void XQueryPathWalk::take(size_t index, int axis, NSXMLNode* node) {
+  const XQueryWalkedStep& step = _steps[index];
+  if (!step.hasPredicates() || filtersEach(step)) {
+    stream(index, axis, node);
+  } else {
+    filter(index, axis, node);
+  }
+}
+
+// Whether it is of use to ask the predicates before all nodes are found, and nobody can tell.
+bool XQueryPathWalk::filtersEach(const XQueryWalkedStep& step) const {
+  return step.filtersEach && results.mayEndEarly() && !listingStep && !setsEveryFocus;
+}
+
+// The same as filtering a list of nodes where no predicate can tell which place a node has in it.
+bool XQueryPathWalk::keepsAlone(const XQueryWalkedStep& step, NSXMLNode* node) {
+  for (auto each = step.firstPredicate(); each != step.step->predicates().end(); ++each) {
+    if (XQueryStep::keeps(**each, node, 1, context)) continue;
+    hasFailed = context._internal().isFailing();
+    return false;
+  }
+  return true;
+}
+
+// Hands each node on as it is found. What the test asks of a node is copied into the walk, where it
+// stays in registers; names are what is walked for most.
+void XQueryPathWalk::stream(size_t index, int axis, NSXMLNode* node) {
+  XQueryStepTest test(_steps[index], *this);
+  if (const NSXMLExpandedName* name = test.onlyName()) {
+    streamMatching(index, axis, node, [name](auto act) { return XQueryNamedVisit(name, act); });
+  } else if (test.onlyNames()) {
+    streamMatching(index, axis, node, [&test](auto act) { return XQueryChoiceVisit(test, act); });
+  } else {
+    streamMatching(index, axis, node, [&test](auto act) {
+      return [&test, act](NSXMLNode* found) { return !test.matches(found) || act(found); };
+    });
+  }
+}
+
+// `visitOf` makes of what is to be done with a matching node a visitor of all nodes.
+template <class VisitOf>
+void XQueryPathWalk::streamMatching(size_t index, int axis, NSXMLNode* node, VisitOf visitOf) {
+  const XQueryWalkedStep& step = _steps[index];
+  const bool isLast = index + 1 == _steps.size();
+  const auto handOn = [this, &step, isLast, index](NSXMLNode* found) {
+    // A trail may go on after the end.
+    if (isOver()) return false;
+    if (step.hasPredicates() && !keepsAlone(step, found)) return !hasFailed;
+    if (isLast) {
+      results.addNode(found, context);
+    } else {
+      takeNode(index + 1, found);
+    }
+    return !isOver();
+  };
+  if (step.gathersFirst) {
+    std::vector<NSXMLNode*>& nodes = openNodeList();
+    XQueryWalkAnyAxis(node, axis, false, visitOf([&nodes](NSXMLNode* found) {
+                        nodes.push_back(found);
+                        return true;
+                      }));
+    for (NSXMLNode* found : nodes) {
+      if (isOver()) break;
+      takeNode(index + 1, found);
+    }
+    closeNodeList();
+  } else if (step.trail != XQueryWalkedStep::noTrail && !setsEveryFocus) {
+    trail(step.trail).walk(node, axis, visitOf(handOn));
+  } else {
+    XQueryWalkAnyAxis(node, axis, false, visitOf(handOn));
+  }
+  // What predicates have filtered is sorted forward, also where they have become part of the test.
+  if (isLast) results.setIsReversed(step.isReverse() && step.step->predicates().empty());
+}
+
+// Gathers the nodes found from one context item, filters them and hands on what is left.
+void XQueryPathWalk::filter(size_t index, int axis, NSXMLNode* node) {
+  const XQueryWalkedStep& step = _steps[index];
+  std::vector<NSXMLNode*>& nodes = openNodeList();
+  const size_t predicatesDone = collect(step, axis, node, nodes);
+  if (listingStep == &step) {
+    listed->insert(listed->end(), nodes.begin(), nodes.end());
+  } else if (step.step->filterNodes(nodes, predicatesDone, context)) {
+    takeNodes(index + 1, nodes);
+  } else {
+    hasFailed = true;
+  }
+  closeNodeList();
+}
+
+// Gathers the step's nodes along the axis, nearest first for a reverse axis. Answers how many
+// predicates are dealt with: the walk stops at the node that a literal position asks for.
+size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
+                               std::vector<NSXMLNode*>& nodes) {
+  XQueryStepTest test(step, *this);
+  const size_t first = step.predicatesInTest;
+  const auto position = step.hasPredicates() ? step.step->literalPosition(first) : std::nullopt;
+  if (position && !step.testMayRaise) {
+    uint64_t left = *position;
+    if (left == 0) return first + 1;
+    XQueryWalkAnyAxis(node, axis, true, [&](NSXMLNode* found) {
+      if (!test.matches(found) || --left > 0) return true;
+      nodes.push_back(found);
+      return false;
+    });
+    return first + 1;
+  }
+  const auto walk = [&](auto visit) {
+    if (step.trail != XQueryWalkedStep::noTrail && !setsEveryFocus) {
+      trail(step.trail).walk(node, axis, visit);
+    } else {
+      XQueryWalkAnyAxis(node, axis, true, visit);
+    }
+  };
+  const auto add = [&nodes](NSXMLNode* found) {
+    nodes.push_back(found);
+    return true;
+  };
+  if (const NSXMLExpandedName* name = test.onlyName()) {
+    walk(XQueryNamedVisit(name, add));
+  } else if (test.onlyNames()) {
+    walk(XQueryChoiceVisit(test, add));
+  } else {
+    walk([&test, add](NSXMLNode* found) { return !test.matches(found) || add(found); });
+  }
+  return first;
+}
+
+}  // namespace xquery

@@ -1,0 +1,96 @@
+// One walk along the steps of a path.
+//
+// Steps are taken node by node, as the path itself takes them, with three shortcuts. They rest on
+// steps that can be repeated: axis steps whose tests cannot raise an error and whose predicates
+// answer the same for the same focus and do nothing else (an error in a predicate only drops its
+// item). What a chain of such steps yields from a node is always the same, nobody can tell when or
+// how often it is asked, and a result holds every node once. A rule finds where this holds
+// (Rules/WalkPaths.cpp); while an error may arise from the items that the path starts from, which
+// would leave the focus of the step it met, none of them is taken.
+//
+//   trail         A step at the head of such a chain whose predicates cannot tell does not walk
+//                 nodes again that it has walked from an earlier context item (XQueryAxisTrail).
+//                 Trails hold nodes of the path's items only, which live as long as the evaluation:
+//                 steps behind an expression keep none.
+//   absorbsNext   "//" and the child step after it visit, for a node whose descendant axis ends
+//                 with its subtree, exactly the node's descendants, each once, as the child of its
+//                 parent. The descendant axis visits the same nodes without touching every node
+//                 twice, or finds them in the index. The order differs (the two steps go parent by
+//                 parent), so the child step takes the descendant axis only when no predicate can
+//                 tell, both are repeatable with all steps after them, and the results will be
+//                 sorted. "//@a" is the same.
+//   filtersEach   Where only some of the nodes are wanted, or their number, a step filters each
+//                 node as it finds it and hands it on, so that the walk ends as soon as the answer
+//                 is certain.
+//
+// An axis step makes each of its context items the focus. Nobody can see that focus, except where
+// an error leaves it behind, so it is left out unless an error may arise.
+//
+// A walk sees the tree as it was when it began: a step before one that may give nodes a parent
+// (gathersFirst) finds all its nodes first and hands them on afterwards.
+#pragma once
+
+#include "Expr/Paths/XQueryPathRun.h"
+#include "Plan/Paths/XQueryAxisTrail.h"
+#include "Plan/Paths/XQueryWalkedStep.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <span>
+#include <vector>
+
+namespace xquery {
+
+class XQueryPathWalk : public XQueryPathRun {
+ public:
+  // `trailCount` of the steps keep trails.
+  XQueryPathWalk(std::span<const XQueryWalkedStep> steps, size_t trailCount,
+                 XQueryPathResults& toResults, XQueryContext& forContext)
+      : XQueryPathRun(toResults, forContext), _steps(steps), _trailCount(trailCount) {}
+
+  // Whether an error may arise from the items that the path starts from.
+  bool setsEveryFocus = true;
+  // The results will be sorted, so the order in which nodes arrive is free.
+  bool orderIsFree = false;
+  // A step with predicates that only lists what it would filter, and where; null otherwise.
+  const XQueryWalkedStep* listingStep = nullptr;
+  std::vector<Value>* listed = nullptr;
+
+  // Whether the steps have nothing more to hand on.
+  bool isOver() const { return hasFailed || results.isComplete(); }
+  // Whether the first step is joined with the one after it where it starts from the node.
+  bool absorbsNext(const XQueryWalkedStep& step, const NSXMLNode* node) const;
+
+  // From step `index` on, for a value of any shape, for one node, and for the nodes that a step
+  // with predicates kept. Behind the last step they are the results.
+  void takeValue(size_t index, const Value& items, bool validate);
+  void takeNode(size_t index, NSXMLNode* node);
+  void takeNodes(size_t index, std::span<NSXMLNode* const> nodes);
+
+ private:
+  void takeItem(size_t index, NSObject* item, int64_t position, bool validate);
+  void take(size_t index, int axis, NSXMLNode* node);
+  void stream(size_t index, int axis, NSXMLNode* node);
+  template <class VisitOf>
+  void streamMatching(size_t index, int axis, NSXMLNode* node, VisitOf visitOf);
+  void filter(size_t index, int axis, NSXMLNode* node);
+  size_t collect(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
+                 std::vector<NSXMLNode*>& nodes);
+  bool filtersEach(const XQueryWalkedStep& step) const;
+  bool keepsAlone(const XQueryWalkedStep& step, NSXMLNode* node);
+
+  // A trail begins anew where a tree has changed since it was last asked for: what a predicate of
+  // an earlier step constructs may give the nodes a parent.
+  XQueryAxisTrail& trail(size_t index);
+
+  struct Trail {
+    XQueryAxisTrail trail;
+    uint64_t changeCount = 0;  // NSXMLTree::changeCount at its last use
+  };
+
+  const std::span<const XQueryWalkedStep> _steps;
+  const size_t _trailCount;
+  std::vector<Trail> _trails;
+};
+
+}  // namespace xquery

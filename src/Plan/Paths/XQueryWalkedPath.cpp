@@ -1,0 +1,235 @@
+#include "Plan/Paths/XQueryWalkedPath.h"
+
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Paths/XQueryPathResults.h"
+#include "Expr/XQuerySequence.h"
+#include "Platform/Base/NSLog.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Types/XQueryAtomization.h"
+
+#include <algorithm>
+
+namespace xquery {
+namespace {
+
+bool allAreNodes(const Value& items) {
+  const XQueryItemList list(items.get());
+  WorkPacer pacer;
+  for (size_t i = 0; i < list.count(); ++i) {
+    pacer.turn();
+    if (!XQueryIsNode(list[i])) return false;
+  }
+  return true;
+}
+
+bool isKeptByAll(const XQueryStep& step, size_t firstPredicate, NSObject* item, int64_t position,
+                 XQueryContext& context) {
+  const auto& predicates = step.predicates();
+  return std::all_of(predicates.begin() + static_cast<std::ptrdiff_t>(firstPredicate),
+                     predicates.end(), [&](const auto& predicate) {
+                       return XQueryStep::keeps(*predicate, item, position, context);
+                     });
+}
+
+}  // namespace
+
+XQueryWalkedPath::XQueryWalkedPath(Ref<XQueryExpr> plain, Ref<XQueryPathExpr> path)
+    : XQueryPlannedExpr(std::move(plain)), _path(std::move(path)) {
+  const XQueryStep* step = _path->step();
+  if (step && !isa<XQueryAxisStep>(step)) {
+    _start = step;
+    step = step->next();
+  }
+  for (; step; step = step->next()) {
+    _steps.emplace_back(*step);
+    _hasPredicates = _hasPredicates || !step->predicates().empty();
+  }
+  const XQueryStep* lastAdopting = nullptr;
+  for (const XQueryWalkedStep& each : _steps) {
+    if (each.step->mayAdopt()) lastAdopting = each.step;
+  }
+  for (XQueryWalkedStep& each : _steps) {
+    if (!lastAdopting || each.step == lastAdopting) break;
+    each.gathersFirst = !each.isExpression();
+  }
+}
+
+const XQueryWalkedStep* XQueryWalkedPath::walked(const XQueryStep& asWritten) const {
+  const auto found = std::find_if(_steps.begin(), _steps.end(), [&](const XQueryWalkedStep& each) {
+    return each.step == &asWritten;
+  });
+  return found == _steps.end() ? nullptr : &*found;
+}
+
+// Diagnostics show every error that a predicate meets.
+bool XQueryWalkedPath::showsErrors() const {
+  return _hasPredicates && XQueryLogEnabled();
+}
+
+Value XQueryWalkedPath::computeValue(XQueryContext& context) const {
+  if (showsErrors()) return plain().evaluateWithContext(context);
+  XQueryCheckStack(context);
+  XQueryPathResults results;
+  Value items;
+  switch (evaluate(context, items, results)) {
+    case Answer::Failed:
+      return {};
+    case Answer::Items:
+      return items;
+    case Answer::Results:
+      break;
+  }
+  return results.value(context._internal().ordered());
+}
+
+std::optional<uint64_t> XQueryWalkedPath::countNodes(uint64_t most, XQueryContext& context) const {
+  XQueryCheckStack(context);
+  XQueryPathResults results;
+  results.endAfter(most);
+  results.countOnly();
+  Value items;
+  const Answer answer = evaluate(context, items, results);
+  if (answer == Answer::Failed) return std::nullopt;
+  // What answers nodes goes through all of the steps, but for no items at all.
+  return answer == Answer::Items ? 0 : std::min(results.count(), most);
+}
+
+Value XQueryWalkedPath::firstItems(uint64_t most, XQueryContext& context) const {
+  XQueryCheckStack(context);
+  XQueryPathResults results;
+  results.endAfter(most);
+  Value items;
+  const Answer answer = evaluate(context, items, results);
+  if (answer == Answer::Results) return results.value(context._internal().ordered());
+  return answer == Answer::Items ? items : Value();
+}
+
+// An item that is no node is an error, wherever it stands among the others. The first nodes of all
+// are those that are found first only where these come in order.
+bool XQueryWalkedPath::mayEndEarly(const Value& items, const XQueryPathWalk& walk) const {
+  if (walk.setsEveryFocus || walk.results.countsOnly()) return !walk.setsEveryFocus;
+  const auto* start = dyn_cast<NSXMLNode>(items.get());
+  if (!start || !walk.orderIsFree) return false;
+  return !_steps.front().absorbsNext || walk.absorbsNext(_steps.front(), start);
+}
+
+// An error leaves the focus as it was when it was raised.
+XQueryWalkedPath::Answer XQueryWalkedPath::evaluate(XQueryContext& context, Value& items,
+                                                    XQueryPathResults& results) const {
+  auto& dynamic = context._internal();
+  const int64_t position = dynamic.position();
+  const int64_t last = dynamic.last();
+  Value contextItem = dynamic.contextItem();
+  const Answer answer = walk(context, items, results);
+  if (answer == Answer::Failed) return answer;
+  dynamic.setContextItem(std::move(contextItem), position);
+  dynamic.setLast(last);
+  return answer;
+}
+
+XQueryWalkedPath::Answer XQueryWalkedPath::walk(XQueryContext& context, Value& items,
+                                                XQueryPathResults& results) const {
+  const auto& dynamic = context._internal();
+  items = _path->step() ? Value(dynamic.contextItem()) : NSNull::null();
+  if (_start) {
+    items = evaluateStart(context);
+    if (XQueryHasFailed(items, context)) return Answer::Failed;
+  }
+  if (_steps.empty() || isNull(items)) return Answer::Items;
+  XQueryPathWalk walk(_steps, _trailCount, results, context);
+  walk.setsEveryFocus = !allAreNodes(items);
+  walk.orderIsFree = dynamic.ordered();
+  if (results.mayEndEarly() && !mayEndEarly(items, walk)) results.takeAll();
+  if (!_picker || !pickNodes(items, walk)) walk.takeValue(0, items, true);
+  return walk.hasFailed ? Answer::Failed : Answer::Results;
+}
+
+Value XQueryWalkedPath::evaluateStart(XQueryContext& context) const {
+  Value items =
+      _start->expr() ? _start->expr()->evaluateWithContext(context) : Value(NSNull::null());
+  if (XQueryHasFailed(items, context)) return {};
+  if (_picker && _pickedStep == _start && pickItems(items, context)) return items;
+  return _start->handlePreicatesFromIndex(0, std::move(items), context);
+}
+
+// --- picking -------------------------------------------------------------------------------------
+
+// Filters the items of the start, of which only some are asked; false when each has to be.
+bool XQueryWalkedPath::pickItems(Value& items, XQueryContext& context) const {
+  const auto listItems = [&items](std::vector<Value>& listed) {
+    return XQueryListItems(XQueryItemList(items.get()), listed);
+  };
+  XQueryPicks picks;
+  if (!_picker->pick(items, listItems, context, picks)) return false;
+  context._internal().setLast(static_cast<int64_t>(picks.items->size()));
+  XQueryGatherer kept;
+  for (const XQueryPick& pick : picks.chosen) {
+    const Value& item = (*picks.items)[pick.position];
+    if (pick.isSure ||
+        isKeptByAll(*_pickedStep, 0, item.get(), int64_t{pick.position} + 1, context)) {
+      kept.add(item);
+    } else if (context._internal().isFailing()) {
+      items = Value();
+      return true;
+    }
+  }
+  items = kept.value();
+  return true;
+}
+
+// The nodes that reach the predicates of a step from the first one.
+bool XQueryWalkedPath::listNodes(const Value& start, const XQueryWalkedStep& step,
+                                 XQueryPathWalk& walk, std::vector<Value>& listed) const {
+  XQueryPathWalk listing(_steps, _trailCount, walk.results, walk.context);
+  listing.setsEveryFocus = false;
+  listing.orderIsFree = walk.orderIsFree;
+  listing.listingStep = &step;
+  listing.listed = &listed;
+  listing.takeValue(0, start, true);
+  walk.hasFailed = listing.hasFailed;
+  return !listing.hasFailed;
+}
+
+bool XQueryWalkedPath::listNodesBefore(const XQueryStep& step, XQueryContext& context,
+                                       std::vector<Value>& nodes) const {
+  Value start = context._internal().contextItem();
+  if (_start) {
+    start = evaluateStart(context);
+    if (XQueryHasFailed(start, context)) return false;
+  }
+  const XQueryWalkedStep* last = walked(step);
+  if (!start || !last || !allAreNodes(start)) return false;
+  XQueryPathResults results;
+  XQueryPathWalk walk(_steps, _trailCount, results, context);
+  return isNull(start) || listNodes(start, *last, walk, nodes);
+}
+
+// The same for the nodes that reach the picked step: hands on what is left.
+bool XQueryWalkedPath::pickNodes(const Value& start, XQueryPathWalk& walk) const {
+  const XQueryWalkedStep* step = walked(*_pickedStep);
+  if (!step || walk.setsEveryFocus) return false;
+  const auto list = [&](std::vector<Value>& listed) {
+    return listNodes(start, *step, walk, listed);
+  };
+  XQueryPicks picks;
+  const bool hasPicked = _picker->pick(start, list, walk.context, picks);
+  if (walk.hasFailed) return true;
+  if (!hasPicked) return false;
+  std::vector<NSXMLNode*>& nodes = walk.openNodeList();
+  for (const XQueryPick& pick : picks.chosen) {
+    auto* node = cast<NSXMLNode>((*picks.items)[pick.position]);
+    // The predicates cannot tell at which position the node stands.
+    if (pick.isSure || isKeptByAll(*step->step, step->predicatesInTest, node, 1, walk.context)) {
+      nodes.push_back(node);
+    } else if (walk.context._internal().isFailing()) {
+      walk.hasFailed = true;
+      return true;
+    }
+  }
+  walk.takeNodes(static_cast<size_t>(step - _steps.data()) + 1, nodes);
+  walk.closeNodeList();
+  return true;
+}
+
+}  // namespace xquery

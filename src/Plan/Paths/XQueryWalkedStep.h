@@ -1,0 +1,93 @@
+// A step of a path as a walk takes it: as it is written, or with names taken into its test, and
+// with what has been found out about it.
+#pragma once
+
+#include "Expr/Paths/XQueryPath.h"
+#include "Expr/Paths/XQueryPathRun.h"
+#include "Plan/Paths/XQueryNameChoice.h"
+
+#include <cstddef>
+#include <memory>
+#include <utility>
+
+namespace xquery {
+
+struct XQueryWalkedStep {
+  static constexpr size_t noTrail = SIZE_MAX;
+
+  explicit XQueryWalkedStep(const XQueryStep& asWritten) : step(&asWritten) {
+    const auto* axisStep = dyn_cast<XQueryAxisStep>(&asWritten);
+    if (!axisStep) return;
+    axis = axisStep->axis();
+    test = axisStep->expr();
+    testMayRaise = axisStep->testMayRaise();
+  }
+
+  // An expression that is evaluated for each node.
+  bool isExpression() const { return axis == 0; }
+  bool isReverse() const { return axis >= XQueryAxisAncestor && axis <= XQueryAxisAncestorOrSelf; }
+  // Whether predicates are left that are no part of the test.
+  bool hasPredicates() const { return predicatesInTest < step->predicates().size(); }
+  auto firstPredicate() const {
+    return step->predicates().begin() + static_cast<std::ptrdiff_t>(predicatesInTest);
+  }
+  // Whether this is the step that "//" stands for.
+  bool isDescendantShorthand() const {
+    const auto* type = dyn_cast<XQueryTypeDeclaration>(test);
+    return axis == XQueryAxisDescendantOrSelf && step->predicates().empty() && !choice && type &&
+           type->type() == XQueryTypeDeclaration::AnyKindTest && !type->data() &&
+           type->acceptsCount(1);
+  }
+  // Has the step take, of the nodes that its test accepts, those of one of the names alone, which
+  // is what so many of its first predicates ask for.
+  void setChoice(XQueryNameChoice names, size_t ofPredicates) {
+    choice = std::make_unique<const XQueryNameChoice>(std::move(names));
+    predicatesInTest = ofPredicates;
+  }
+  // Puts a step with such names in the place of the expression.
+  void becomeAxisStep(int onAxis, XQueryNameChoice names) {
+    axis = onAxis;
+    ownTest = XQueryWildCardNameTest::nameTest(nullptr, nullptr);
+    test = ownTest.get();
+    setChoice(std::move(names), 0);
+  }
+
+  const XQueryStep* step;  // as it is written; its predicates are those of the walk
+  int axis = 0;            // 0 for an expression
+  const XQueryExpr* test = nullptr;
+  bool testMayRaise = false;
+  Ref<XQueryExpr> ownTest;
+  std::unique_ptr<const XQueryNameChoice> choice;  // null for none
+  size_t predicatesInTest = 0;
+
+  // See XQueryPathWalk.h.
+  bool absorbsNext = false;
+  bool filtersEach = false;
+  bool gathersFirst = false;
+  size_t trail = noTrail;
+};
+
+// The test of such a step, made ready for its nodes.
+class XQueryStepTest {
+ public:
+  XQueryStepTest(const XQueryWalkedStep& step, XQueryPathRun& run);
+
+  bool matches(const NSXMLNode* node) {
+    return _test.matches(node) && (!_choice || _choice->accepts(*node, _context));
+  }
+  // As XQueryNodeTest.
+  const NSXMLExpandedName* onlyName() const { return _isOfName ? _test.onlyName() : nullptr; }
+  // The same for names of which a node needs one; instructions may have them as well.
+  const NSXMLNameSelection* onlyNames() const { return _context ? nullptr : _choice; }
+  bool acceptsInstructions() const {
+    return (_test.kinds() & XQueryKindBit(Kind::ProcessingInstruction)) != 0;
+  }
+
+ private:
+  XQueryNodeTest _test;
+  const XQueryNameChoice* _choice;
+  bool _isOfName = true;              // the name is all that it asks for
+  XQueryContext* _context = nullptr;  // where the names depend on its namespaces
+};
+
+}  // namespace xquery
