@@ -28,6 +28,8 @@ constexpr std::array rules = {
                XQueryAskMembers},
     XQueryRule{"texts", "comparing children and attributes with a constant makes no values",
                XQueryCompareConstants},
+    XQueryRule{"conditions", "several conditions on a node are asked of it as it is",
+               XQueryJoinConditions},
     XQueryRule{"short paths", "what a few steps find from one node is taken as it comes",
                XQueryShortenPaths},
     XQueryRule{"operands", "arithmetic and comparisons of numbers and texts make no values between",

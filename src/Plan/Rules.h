@@ -40,5 +40,6 @@ void XQueryCompareConstants(XQueryPlanning& planning);
 void XQueryShortenPaths(XQueryPlanning& planning);
 void XQueryAnswerQuickly(XQueryPlanning& planning);
 void XQueryBuildInPlace(XQueryPlanning& planning);
+void XQueryJoinConditions(XQueryPlanning& planning);
 
 }  // namespace xquery

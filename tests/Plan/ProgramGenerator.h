@@ -90,7 +90,10 @@ class ProgramGenerator {
       case 0:
         return "[" + _random.oneOf({"1", "2", "last()", "position() < 3", "position() = 1"}) + "]";
       case 1:
-        return "[" + _random.oneOf({"@x", "b", "c/a", "not(@y)"}) + "]";
+        return "[" +
+               _random.oneOf({"@x", "b", "c/a", "not(@y)", "b and @x", "not(a or @y = 1)",
+                              "ancestor::b", "not(. = 'u') and c", "exists(b[. = 2])"}) +
+               "]";
       case 2:
         return "[" + nameCondition() + "]";
       case 3:
@@ -155,8 +158,9 @@ class ProgramGenerator {
       text += _random.oneOf({"(a | b)", "(a | b | c)", "(@x | @y)", "(a | a)", "(a | @x)"});
       return depth > 0 && _random.below(3) == 0 ? text + predicate(depth) : text;
     }
-    text += _random.oneOf({"", "", "", "", "@", "..", "self::", "following-sibling::",
-                           "preceding-sibling::", "ancestor::", "descendant::", "following::"});
+    text += _random.oneOf({"", "", "", "", "@", "..",
+                           "self::", "following-sibling::", "preceding-sibling::", "ancestor::",
+                           "ancestor-or-self::", "descendant::", "following::"});
     if (text.ends_with("..")) return text;
     text += text.ends_with("@") ? _random.oneOf({"x", "y", "*"}) : nodeTest();
     if (depth > 0 && _random.below(3) == 0) text += predicate(depth);

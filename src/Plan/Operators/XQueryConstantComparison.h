@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Expr/Operators/XQueryComparison.h"
+#include "Plan/Operators/XQueryNodeQuestion.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
 #include "Plan/Operators/XQueryShortWalk.h"
 #include "xquery/String.h"
@@ -10,7 +11,7 @@
 
 namespace xquery {
 
-class XQueryConstantComparison : public XQueryPlannedExpr {
+class XQueryConstantComparison : public XQueryPlannedExpr, private XQueryNodeQuestion {
  public:
   struct Constant {
     Ref<NSString> text;  // exactly xs:string; null for a number
@@ -31,6 +32,9 @@ class XQueryConstantComparison : public XQueryPlannedExpr {
   // from anything but one node, for a text that is no number where the constant is one, and for a
   // value comparison of other than one node.
   Value computeValue(XQueryContext& context) const override;
+  const XQueryNodeQuestion* nodeQuestion() const override {
+    return _walk.startsFromFocus() ? this : nullptr;
+  }
 
  protected:
   XQueryConstantComparison(Ref<XQueryExpr> plain, const XQueryShortWalk& walk,
@@ -44,7 +48,13 @@ class XQueryConstantComparison : public XQueryPlannedExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  std::optional<bool> holdsFor(const NSXMLNode& node) const;
+  struct Answer {
+    bool isKnown;
+    std::optional<bool> holds;  // none where there are no nodes
+  };
+  std::optional<bool> holdsOf(const NSXMLNode& node) const;
+  Answer answerFrom(NSXMLNode* start) const;
+  std::optional<bool> holdsFor(NSXMLNode* node, const XQueryContext& context) const override;
 
   const XQueryShortWalk _walk;
   const XQueryRelation _relation;

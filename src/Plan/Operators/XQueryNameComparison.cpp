@@ -6,12 +6,16 @@
 
 namespace xquery {
 
-Value XQueryNameComparison::computeValue(XQueryContext& context) const {
-  const auto* node = dyn_cast<NSXMLNode>(context._internal().contextItem());
-  const bool isNamed = node && (node->kind() == Kind::Element || node->kind() == Kind::Attribute);
-  if (!isNamed) return plain().evaluateWithContext(context);
+std::optional<bool> XQueryNameComparison::holdsFor(NSXMLNode* node, const XQueryContext&) const {
+  if (node->kind() != Kind::Element && node->kind() != Kind::Attribute) return std::nullopt;
   const NSStringView name = _which == Name::Local ? node->localNameView() : node->nameView();
-  return NSNumber::numberWithBool(name == _text->view());
+  return name == _text->view();
+}
+
+Value XQueryNameComparison::computeValue(XQueryContext& context) const {
+  auto* node = dyn_cast<NSXMLNode>(context._internal().contextItem());
+  const auto answer = node ? holdsFor(node, context) : std::nullopt;
+  return answer ? Value(NSNumber::numberWithBool(*answer)) : plain().evaluateWithContext(context);
 }
 
 }  // namespace xquery

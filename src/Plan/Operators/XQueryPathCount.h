@@ -2,15 +2,18 @@
 // "exists(P)", "empty(P)", "not(P)", "count(P) > 2", P itself where its truth is asked for.
 #pragma once
 
+#include "Plan/Operators/XQueryNodeQuestion.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
+#include "Plan/Operators/XQueryShortWalk.h"
 #include "Plan/Paths/XQueryWalkedPath.h"
 
 #include <cstdint>
+#include <optional>
 #include <utility>
 
 namespace xquery {
 
-class XQueryPathCount : public XQueryPlannedExpr {
+class XQueryPathCount : public XQueryPlannedExpr, private XQueryNodeQuestion {
  public:
   // What is asked of the number of nodes.
   struct Question {
@@ -28,16 +31,29 @@ class XQueryPathCount : public XQueryPlannedExpr {
 
   // An integer, or one of the shared truth values.
   Value computeValue(XQueryContext& context) const override;
+  const XQueryNodeQuestion* nodeQuestion() const override {
+    const bool isQuestion = _question.least != 0 && _isShort && _shortWalk.startsFromFocus();
+    return isQuestion ? this : nullptr;
+  }
 
  protected:
   XQueryPathCount(Ref<XQueryExpr> plain, Ref<XQueryWalkedPath> path, Question question)
-      : XQueryPlannedExpr(std::move(plain)), _path(std::move(path)), _question(question) {}
+      : XQueryPlannedExpr(std::move(plain)),
+        _path(std::move(path)),
+        _question(question),
+        _isShort(_shortWalk.readFrom(_path->path())) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
+  std::optional<bool> holdsFor(NSXMLNode* node, const XQueryContext& context) const override;
+  uint64_t countFrom(NSXMLNode* node, uint64_t most) const;
+  std::optional<uint64_t> countUpTo(uint64_t most, XQueryContext& context) const;
+
   const Ref<XQueryWalkedPath> _path;
   const Question _question;
+  XQueryShortWalk _shortWalk;
+  const bool _isShort;  // from one node the short walk finds the same
 };
 
 }  // namespace xquery

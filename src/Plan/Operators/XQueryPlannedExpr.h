@@ -12,6 +12,7 @@
 
 namespace xquery {
 
+class XQueryNodeQuestion;
 class XQueryWalkedPath;
 
 class XQueryPlannedExpr : public XQueryExpr {
@@ -21,6 +22,8 @@ class XQueryPlannedExpr : public XQueryExpr {
   const XQueryExpr& plain() const { return *_plain; }
   // Itself, where it is one.
   virtual const XQueryWalkedPath* walkedPath() const { return nullptr; }
+  // What it is as a condition on its context item; null where that takes evaluating it.
+  virtual const XQueryNodeQuestion* nodeQuestion() const { return nullptr; }
   // What it stands for has been bound.
   void bindInfoForProlog(XQueryProlog&) override {}
   void visitParts(XQueryPartVisitor& visitor) override {

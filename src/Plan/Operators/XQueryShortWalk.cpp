@@ -35,7 +35,8 @@ bool XQueryShortWalk::readStep(const XQueryAxisStep& step) {
   // A parent comes first, so that there is one of them.
   const bool isLeading = _count == 0 || _steps[_count - 1].axis == XQueryAxisParent;
   const bool isOpen = step.axis() == XQueryAxisChild || step.axis() == XQueryAxisAttribute ||
-                      (step.axis() == XQueryAxisParent && isLeading);
+                      (step.axis() == XQueryAxisParent && isLeading) ||
+                      (goesUp(step.axis()) && _count == 0);
   if (!isOpen) return false;
   const NSXMLExpandedName* name = nullptr;
   uint32_t kinds = 0;

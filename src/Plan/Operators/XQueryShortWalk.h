@@ -1,9 +1,11 @@
 // The walk of a short path: from one node over children and attributes of given names, and of these
-// all there are.
+// all there are, or over its ancestors first.
 //
 // What such a path finds from one node comes in document order, each node once: the children of a
 // node stand in their order, the subtrees of two children do not meet, and attributes have no
-// children. So there is nothing to sort and nothing to look for twice.
+// children. So there is nothing to sort and nothing to look for twice. Ancestors come the nearest
+// first, as a path answers them; what is found from several of them comes once, but in another
+// order than that of the path.
 #pragma once
 
 #include "Context/XQueryContextInternal.h"
@@ -27,15 +29,23 @@ class XQueryShortWalk {
   // expression. Lives no longer than that expression.
   [[nodiscard]] bool readFrom(const XQueryExpr& expr);
 
+  // Whether it starts from the context item.
+  bool startsFromFocus() const { return _varID == 0; }
+  // Whether it is open for a start that is a node.
+  bool isOpen(const XQueryContext& context) const {
+    return !_needsNoDefaultNamespace || !context._internal().hasDefaultNamespace();
+  }
   // The node to start from; null where the walk is not open: there is none or there are several, or
   // names have to be resolved in the namespaces of the context.
   NSXMLNode* start(const XQueryContext& context) const {
+    if (!isOpen(context)) return nullptr;
     const auto& dynamic = context._internal();
-    if (_needsNoDefaultNamespace && dynamic.hasDefaultNamespace()) return nullptr;
     return dyn_cast<NSXMLNode>(_varID ? dynamic.variableForID(_varID)
                                       : dynamic.contextItem().get());
   }
-  // Visits what there is below the start, until the visitor answers false.
+  // Whether the nodes come in the order in which the path answers them.
+  bool visitsInOrder() const { return _count <= 1 || !goesUp(_steps[0].axis); }
+  // Visits what there is from the start on, until the visitor answers false.
   template <class Visit>
   void visit(NSXMLNode* start, Visit visit) const {
     visitFrom(0, start, visit);
@@ -53,6 +63,9 @@ class XQueryShortWalk {
   };
 
   bool readStep(const XQueryAxisStep& step);
+  static bool goesUp(int axis) {
+    return axis == XQueryAxisAncestor || axis == XQueryAxisAncestorOrSelf;
+  }
 
   // False to end the walk.
   template <class Visit>
@@ -68,6 +81,8 @@ class XQueryShortWalk {
       XQueryWalkSiblings(node->firstChild(), take);
     } else if (step.axis == XQueryAxisAttribute) {
       XQueryWalkAttributes(node, take);
+    } else if (goesUp(step.axis)) {
+      XQueryWalkAncestors(step.axis == XQueryAxisAncestor ? node->parent() : node, take);
     } else if (node->parent()) {
       take(node->parent());
     }

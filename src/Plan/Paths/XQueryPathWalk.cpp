@@ -4,6 +4,8 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryPathResults.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Operators/XQueryNodeQuestion.h"
+#include "Plan/Operators/XQueryPlannedExpr.h"
 #include "Plan/Paths/XQueryIndexedWalk.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
@@ -18,6 +20,12 @@ bool descendantsAreSubtree(const NSXMLNode* node) {
   // Without a node to stop at the walk goes to the end of the document, which is the end of the
   // subtree of the topmost node and of its last child.
   return XQueryDescendantStop(node) || !node->parent() || !node->parent()->parent();
+}
+
+// What the predicate is as a condition on a node; null where it has to be evaluated.
+const XQueryNodeQuestion* questionIn(const XQueryExpr* predicate) {
+  const auto* planned = dyn_cast<XQueryPlannedExpr>(predicate);
+  return planned ? planned->nodeQuestion() : nullptr;
 }
 
 }  // namespace
@@ -116,10 +124,51 @@ bool XQueryPathWalk::filtersEach(const XQueryWalkedStep& step) const {
 // The same as filtering a list of nodes where no predicate can tell which place a node has in it.
 bool XQueryPathWalk::keepsAlone(const XQueryWalkedStep& step, NSXMLNode* node) {
   for (auto each = step.firstPredicate(); each != step.step->predicates().end(); ++each) {
+    const XQueryNodeQuestion* question = questionIn(each->get());
+    const auto answer = question ? question->holdsFor(node, context) : std::nullopt;
+    if (answer.value_or(false)) continue;
+    if (answer) return false;
     if (XQueryStep::keeps(**each, node, 1, context)) continue;
     hasFailed = context._internal().isFailing();
     return false;
   }
+  return true;
+}
+
+// The same as the step does, which asks predicate after predicate of all nodes that are left.
+bool XQueryPathWalk::filterNodes(const XQueryWalkedStep& step, size_t fromIndex,
+                                 std::vector<NSXMLNode*>& nodes) {
+  const auto& predicates = step.step->predicates();
+  for (size_t index = fromIndex; index < predicates.size(); ++index) {
+    const XQueryNodeQuestion* question =
+        step.step->asksForPosition(index) ? nullptr : questionIn(predicates[index].get());
+    if (!question) return step.step->filterNodes(nodes, index, context);
+    if (!keepNodes(*predicates[index], *question, nodes)) return false;
+  }
+  return true;
+}
+
+// The focus that asking leaves is that of the last node.
+bool XQueryPathWalk::keepNodes(const XQueryExpr& predicate, const XQueryNodeQuestion& question,
+                               std::vector<NSXMLNode*>& nodes) {
+  auto& dynamic = context._internal();
+  dynamic.setLast(static_cast<int64_t>(nodes.size()));
+  NSXMLNode* const last = nodes.empty() ? nullptr : nodes.back();
+  WorkPacer pacer;
+  size_t kept = 0;
+  for (size_t i = 0; i < nodes.size(); ++i) {
+    pacer.turn();
+    NSXMLNode* node = nodes[i];
+    const auto answer = question.holdsFor(node, context);
+    if (answer ? *answer
+               : XQueryStep::keeps(predicate, node, static_cast<int64_t>(i) + 1, context)) {
+      nodes[kept++] = node;
+    } else if (!answer && dynamic.isFailing()) {
+      return false;
+    }
+  }
+  if (last) dynamic.setContextItem(last, static_cast<int64_t>(nodes.size()));
+  nodes.resize(kept);
   return true;
 }
 
@@ -181,7 +230,7 @@ void XQueryPathWalk::filter(size_t index, int axis, NSXMLNode* node) {
   const size_t predicatesDone = collect(step, axis, node, nodes);
   if (listingStep == &step) {
     listed->insert(listed->end(), nodes.begin(), nodes.end());
-  } else if (step.step->filterNodes(nodes, predicatesDone, context)) {
+  } else if (filterNodes(step, predicatesDone, nodes)) {
     takeNodes(index + 1, nodes);
   } else {
     hasFailed = true;

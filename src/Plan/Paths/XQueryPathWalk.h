@@ -41,6 +41,8 @@
 
 namespace xquery {
 
+class XQueryNodeQuestion;
+
 class XQueryPathWalk : public XQueryPathRun {
  public:
   // `trailCount` of the steps keep trails.
@@ -78,6 +80,9 @@ class XQueryPathWalk : public XQueryPathRun {
                  std::vector<NSXMLNode*>& nodes);
   bool filtersEach(const XQueryWalkedStep& step) const;
   bool keepsAlone(const XQueryWalkedStep& step, NSXMLNode* node);
+  bool filterNodes(const XQueryWalkedStep& step, size_t fromIndex, std::vector<NSXMLNode*>& nodes);
+  bool keepNodes(const XQueryExpr& predicate, const XQueryNodeQuestion& question,
+                 std::vector<NSXMLNode*>& nodes);
 
   // A trail begins anew where a tree has changed since it was last asked for: what a predicate of
   // an earlier step constructs may give the nodes a parent.

@@ -61,7 +61,9 @@ class Comparison {
       nodes = _expr.right();
     }
     XQueryShortWalk walk;
-    if (!constant || !nodes || !walk.readFrom(*nodes)) return nullptr;
+    if (!constant || !nodes || !walk.readFrom(*nodes) || !walk.visitsInOrder()) {
+      return nullptr;
+    }
     if (isValueComparison && !constant->text) return nullptr;
     const int code = isValueComparison ? type : type + XQueryOperatorEq - XQueryOperatorEqual;
     XQueryRelation relation = XQueryRelationForCode(code);

@@ -2,7 +2,7 @@
 //
 // Pattern     "$p/name", "@id", "../price/text()": up to four steps to parents, which come first,
 //             to children and to attributes, by names or by text() and node(), without predicates,
-//             from the context item or a local variable
+//             from the context item or a local variable; "ancestor::item" alone
 // Facts       none are asked for: at each use it is asked whether there is one node to start from
 // Operator    XQueryShortPath: walks and takes what it finds as it comes
 // Why         what is found from one node comes in document order and each node once, as sorting
@@ -19,7 +19,7 @@ void XQueryShortenPaths(XQueryPlanning& planning) {
     const XQueryPlace& at = planning.program[place];
     if (!isa<XQueryPathExpr>(at.expr) || !planning.isOpen(place)) continue;
     XQueryShortWalk walk;
-    if (!walk.readFrom(*at.expr)) continue;
+    if (!walk.readFrom(*at.expr) || !walk.visitsInOrder()) continue;
     planning.wrap(place, XQueryShortPath::exprWithPlain(*at.slot, walk));
   }
 }
