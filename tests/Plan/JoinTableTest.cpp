@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -26,16 +28,36 @@ XQueryJoinRelation condition(XQueryRelation::Test test, bool negated = false,
   return made;
 }
 
+// A null key stands for one that cannot be read.
+XQueryJoinTable tableOf(const XQueryJoinRelation& by, const std::vector<Value>& keys) {
+  return XQueryJoinTable(by, std::make_shared<std::vector<Value>>(keys),
+                         [&keys](size_t position) { return keys[position]; });
+}
+
+bool select(XQueryJoinTable& table, const Value& probe, XQueryJoinTable::Selection& selection,
+            bool wantsFirst = false) {
+  const auto question = table.questionOf(probe);
+  if (question) table.select(*question, selection, wantsFirst);
+  return question.has_value();
+}
+
 // The positions that a table of the keys selects, those that have to be asked with a "?"; "plain"
-// for the plain way. A null key stands for one that cannot be read.
+// for the plain way. Each item, asked for by itself, has to answer the same.
 std::string selected(const XQueryJoinRelation& by, const std::vector<Value>& keys,
                      const Value& probe) {
-  XQueryJoinTable table(by, keys, [&](size_t position) { return keys[position]; });
+  XQueryJoinTable table = tableOf(by, keys);
   XQueryJoinTable::Selection selection;
-  if (!table.select(probe, selection)) return "plain";
+  const auto question = table.questionOf(probe);
+  if (!question) return "plain";
+  table.select(*question, selection);
   std::string text;
+  std::vector<std::optional<bool>> answers(keys.size(), false);
   for (const auto& match : selection) {
     text += (text.empty() ? "" : " ") + std::to_string(match.position) + (match.isSure ? "" : "?");
+    answers[match.position] = match.isSure ? std::optional(true) : std::nullopt;
+  }
+  for (uint32_t position = 0; position < keys.size(); ++position) {
+    EXPECT_EQ(table.isMetBy(*question, position), answers[position]) << position << " of " << text;
   }
   return text;
 }
@@ -67,15 +89,13 @@ TEST(JoinTable, ManyProbesFindTheSameByTheOrderOfTheKeys) {
   for (const auto test : {less, XQueryRelation::Greater}) {
     for (const bool negated : {false, true}) {
       for (const auto* keys : {&texts, &numbers}) {
-        XQueryJoinTable table(condition(test, negated), *keys,
-                              [&](size_t position) { return (*keys)[position]; });
+        XQueryJoinTable table = tableOf(condition(test, negated), *keys);
         for (int probe = -1; probe <= 100; ++probe) {
           XQueryJoinTable::Selection selection;
           XQueryJoinTable::Selection fresh;
-          XQueryJoinTable other(condition(test, negated), *keys,
-                                [&](size_t position) { return (*keys)[position]; });
-          ASSERT_TRUE(table.select(number(probe), selection));
-          ASSERT_TRUE(other.select(number(probe), fresh));
+          XQueryJoinTable other = tableOf(condition(test, negated), *keys);
+          ASSERT_TRUE(select(table, number(probe), selection));
+          ASSERT_TRUE(select(other, number(probe), fresh));
           EXPECT_EQ(selection, fresh) << test << negated << probe;
           EXPECT_EQ(table.meets(number(probe)), !fresh.empty());
         }
@@ -88,9 +108,9 @@ TEST(JoinTable, ManyProbesFindTheSameByTheOrderOfTheKeys) {
 TEST(JoinTable, AKeyMeetsEqualProbesOnce) {
   constexpr size_t many = 30000;
   const std::vector<Value> keys(many, string("a"));
-  XQueryJoinTable table(condition(equal), keys, [&](size_t position) { return keys[position]; });
+  XQueryJoinTable table = tableOf(condition(equal), keys);
   XQueryJoinTable::Selection selection;
-  ASSERT_TRUE(table.select(sequence(keys), selection));
+  ASSERT_TRUE(select(table, sequence(keys), selection));
   EXPECT_EQ(selection.size(), many);
   EXPECT_EQ(selected(condition(equal), {number(0), number(1)},
                      sequence({number(1), number(-0.0), number(0), number(1), nan()})),
@@ -100,7 +120,8 @@ TEST(JoinTable, AKeyMeetsEqualProbesOnce) {
 TEST(JoinTable, ItemsOfThousandsOfKeysMakeNone) {
   const auto isComplete = [](size_t items, size_t keysOfEach) {
     const Value keys = sequence(std::vector<Value>(keysOfEach, string("a")));
-    return XQueryJoinTable(condition(equal), std::vector<Value>(items, string("i")),
+    return XQueryJoinTable(condition(equal),
+                           std::make_shared<std::vector<Value>>(items, string("i")),
                            [&](size_t) { return keys; })
         .isComplete();
   };
@@ -132,17 +153,26 @@ TEST(JoinTable, DecimalsThatAreNoDoublesAreAskedWhereTheDoublesAreEqual) {
   EXPECT_EQ(selected(condition(less), keys, integer(9007199254740992)), "0? 1");
   EXPECT_EQ(selected(condition(less), keys, integer(9007199254740999)), "0 1");
   EXPECT_EQ(selected(condition(less, true), keys, integer(9007199254740992)), "0?");
-  XQueryJoinTable table(condition(equal), keys, [&](size_t position) { return keys[position]; });
+  XQueryJoinTable table = tableOf(condition(equal), keys);
   EXPECT_EQ(table.meets(integer(9007199254740992)), std::nullopt);
   EXPECT_EQ(table.meets(integer(7)), false);
 }
 
 TEST(JoinTable, TheFirstSureItemIsEnoughWhereThatIsAskedFor) {
   const std::vector<Value> keys = {number(9), boolean(true), number(2), number(1), number(1)};
-  XQueryJoinTable table(condition(less), keys, [&](size_t position) { return keys[position]; });
+  XQueryJoinTable table = tableOf(condition(less), keys);
   XQueryJoinTable::Selection selection;
-  EXPECT_TRUE(table.select(number(3), selection, true));
+  EXPECT_TRUE(select(table, number(3), selection, true));
   EXPECT_EQ(selection, (XQueryJoinTable::Selection{{1, false}, {2, true}}));
+}
+
+TEST(JoinTable, EstimatesNoFewerThanItFinds) {
+  std::vector<Value> keys;
+  for (int i = 0; i < 100; ++i) keys.push_back(untyped(std::to_string(i % 10)));
+  XQueryJoinTable same = tableOf(condition(equal), keys);
+  EXPECT_GE(same.estimateFor(*same.questionOf(string("3"))), 10U);
+  EXPECT_LT(same.estimateFor(*same.questionOf(string("3"))), 100U);
+  EXPECT_EQ(same.estimateFor(*same.questionOf(empty())), 0U);
 }
 
 TEST(JoinTable, KeysThatCannotBeReadOrMixKindsAreAsked) {

@@ -175,6 +175,41 @@ TEST(Join, PredicatesAnswerAsThePlainWay) {
   }
 }
 
+// Often enough that each comparison has a table of its own.
+TEST(Join, SeveralComparisonsAnswerAsThePlainWay) {
+  for (unsigned seed = 1; seed <= 600; ++seed) {
+    Generator generate(seed);
+    const std::string text = generate.document(seed % 3 == 0);
+    const Value document = parsed(text);
+    const bool isPredicate = generate.below(3) == 0;
+    const std::string item = isPredicate ? "." : "$x";
+    std::string conditions;
+    for (size_t count = 2 + generate.below(2); count > 0; --count) {
+      const std::string probe = generate.oneOf({"$p", "$p", "$q", "string($q)", "($p, $q)", "'1'"});
+      conditions += generate.comparison(generate.key(item), probe);
+      if (generate.below(6) == 0) conditions += " and " + item + "/@n > 3";
+      if (generate.below(6) == 0) conditions += " and $q != '2'";
+      if (count > 1) conditions += " and ";
+    }
+    const std::string items = generate.items();
+    const std::string negated =
+        "(every $x in " + items + " satisfies not(" + conditions + ")), $x/@n/string()";
+    const std::string joined =
+        isPredicate
+            ? items + "[" + conditions + "]"
+            : generate.oneOf({"for $x in " + items + " where " + conditions + " return $x",
+                              "for $x at $i in " + items + " where " + conditions + " return $i",
+                              "(some $x in " + items + " satisfies (" + conditions + ")), $x",
+                              negated});
+    const std::string query = prolog + "for $q in " + generate.probes() + ", $p in (" +
+                              generate.probes() + ", " + generate.probes() + ") return (" + joined +
+                              ", '|')";
+    EXPECT_EQ(answer(query, document), plainAnswer(query, document))
+        << "seed " << seed << ": " << query << "\n"
+        << text;
+  }
+}
+
 // --- what joins are and are not ------------------------------------------------------------------
 
 TEST(Join, ARoundMayBeginAnotherOneOfTheSameExpression) {

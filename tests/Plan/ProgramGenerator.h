@@ -440,7 +440,8 @@ class ProgramGenerator {
 
   // The same condition for one item after another, so that a table is worth its making.
   std::string join(int depth) {
-    std::string text = "for $o in (//a)[position() < 4] return (";
+    std::string text =
+        "for $o in (//a)[position() < " + _random.oneOf({"4", "4", "12"}) + "] return (";
     return "(" + text + within("$o", [&] { return joined(depth - 1); }) + "))";
   }
 

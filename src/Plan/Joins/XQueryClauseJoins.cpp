@@ -87,7 +87,7 @@ void XQueryClauseJoins::joinClause(size_t index) {
   XQueryJoinCondition condition = _picks == Picks::WhereItHolds
                                       ? search.conditionIn(_condition, false)
                                       : search.complementIn(_condition);
-  if (!condition.key) return;
+  if (condition.terms.empty()) return;
   later.leftovers.add(condition.assigns);
   if (later.obstacle.empty() && _planning.showsLeftovers(later.leftovers, _condition)) {
     later.obstacle = "a variable that would be left with another item may be read unset";

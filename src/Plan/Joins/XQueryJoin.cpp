@@ -4,11 +4,13 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/NSLog.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "xquery/Number.h"
 
 #include <algorithm>
 #include <utility>
+#include <vector>
 
 namespace xquery {
 namespace {
@@ -36,19 +38,66 @@ bool isBrieflySettledAround(const Value& value) {
   return XQueryItemList(value.get()).count() <= mostItems && XQueryAreSettled({&value, 1}, true);
 }
 
-enum class Answer : uint8_t { No, Yes, Failure };
+// Whether what is found outside the nodes is the same for the whole round, whatever is constructed
+// meanwhile.
+bool isInvariantInRound(const XQueryFacts& facts, XQueryContext& context) {
+  const auto& dynamic = context._internal();
+  if (facts.does(XQueryDeeds::ReadsGlobals) || !facts.reads.isExact()) return false;
+  const bool readsFocus = facts.does(XQueryDeeds::ReadsItem | XQueryDeeds::ReadsRoot);
+  if (readsFocus && !isBrieflySettledAround(dynamic.contextItem())) return false;
+  bool areSettled = true;
+  facts.reads.forEach([&](int64_t varID) {
+    areSettled = areSettled && isBrieflySettledAround(dynamic.variableForID(varID));
+  });
+  return areSettled;
+}
+
+enum class Truth : uint8_t { No, Yes, Failure };
 
 // What the conditions, joined by "and", come to.
-Answer answerOf(const std::vector<Ref<XQueryExpr>>& conditions, XQueryContext& context) {
+Truth truthOf(const std::vector<Ref<XQueryExpr>>& conditions, XQueryContext& context) {
   for (const auto& condition : conditions) {
     const Value value = valueOrNull(*condition, context);
-    if (!value) return Answer::Failure;
-    if (!XQueryIsTrue(XQueryEffectiveBooleanValue(value, context))) return Answer::No;
+    if (!value) return Truth::Failure;
+    if (!XQueryIsTrue(XQueryEffectiveBooleanValue(value, context))) return Truth::No;
   }
-  return Answer::Yes;
+  return Truth::Yes;
+}
+
+bool anyFails(const std::vector<Ref<XQueryExpr>>& exprs, XQueryContext& context) {
+  return std::any_of(exprs.begin(), exprs.end(),
+                     [&](const auto& expr) { return !valueOrNull(*expr, context); });
 }
 
 }  // namespace
+
+// The tables of one list of items, one for each term of the condition. That of the first term is
+// made at once, those of others when it has picked as many items as making them takes.
+class XQueryJoin::Tables final : public XQueryKeptValue {
+ public:
+  Tables(XQueryJoinTable::Items ofItems, size_t terms) : items(std::move(ofItems)), byTerm(terms) {}
+
+  bool areAllTried() const { return next == byTerm.size(); }
+  // Whether the tables that must answer do so for an item.
+  bool answersFor(size_t position, const XQueryJoinCondition& condition) const {
+    for (size_t term = 0; term < byTerm.size(); ++term) {
+      const bool isAsked = condition.terms[term].mustAnswer && byTerm[term];
+      if (isAsked && byTerm[term]->isIrregular(static_cast<uint32_t>(position))) return false;
+    }
+    return true;
+  }
+
+  const XQueryJoinTable::Items items;
+  std::vector<std::unique_ptr<XQueryJoinTable>> byTerm;  // null for one that is not there
+  size_t next = 0;                                       // the one that is made next
+  size_t picked = 0;                                     // items, since the last one was made
+};
+
+// What a table is asked in this round.
+struct XQueryJoin::Asked {
+  XQueryJoinTable* table;
+  XQueryJoinTable::Question question;
+};
 
 std::unique_ptr<const XQueryJoin> XQueryJoin::ofClause(const XQueryExpr& owner, int64_t varID,
                                                        XQueryJoinCondition condition) {
@@ -63,51 +112,36 @@ std::unique_ptr<const XQueryJoin> XQueryJoin::ofStep(const XQueryExpr& owner,
       new XQueryJoin(owner, 0, std::move(condition), looksAround));
 }
 
-// Whether what probe and guards find outside their nodes is the same for the whole round, whatever
-// is constructed meanwhile.
-bool XQueryJoin::isInvariantInRound(XQueryContext& context) const {
-  const auto& dynamic = context._internal();
-  return std::all_of(
-      _condition.outward.begin(), _condition.outward.end(), [&](const XQueryFacts& facts) {
-        if (facts.does(XQueryDeeds::ReadsGlobals) || !facts.reads.isExact()) return false;
-        const bool readsFocus = facts.does(XQueryDeeds::ReadsItem | XQueryDeeds::ReadsRoot);
-        if (readsFocus && !isBrieflySettledAround(dynamic.contextItem())) return false;
-        bool areSettled = true;
-        facts.reads.forEach([&](int64_t varID) {
-          areSettled = areSettled && isBrieflySettledAround(dynamic.variableForID(varID));
-        });
-        return areSettled;
-      });
-}
-
 bool XQueryJoin::pick(const Value& source, const Lister& listItems, XQueryContext& context,
                       XQueryPicks& picks) const {
   if (!source || XQueryLogEnabled()) return false;
   if (_varID != 0 && XQueryItemList(source.get()).count() < XQueryJoinTable::fewestItems) {
     return false;
   }
-  const auto found = table(source, listItems, context);
-  if (!found || !isInvariantInRound(context)) return false;
-  const bool needsFail =
-      std::any_of(_condition.needed.begin(), _condition.needed.end(),
-                  [&](const auto& expr) { return !valueOrNull(*expr, context); });
-  if (needsFail) return false;
-  const Answer guards = answerOf(_condition.guards, context);
-  if (guards == Answer::Failure) return false;
-  // Without a probe nothing is met, but what may be an error has still to be asked.
-  Value probe = guards == Answer::Yes ? valueOrNull(*_condition.probe, context) : NSNull::null();
-  if (guards == Answer::No && _condition.relation.isComplement) return false;
-  if (!found->select(probe, picks.chosen, picks.wantsFirst && _condition.isWhole)) return false;
-  if (!_condition.isWhole) {
-    for (XQueryPick& pick : picks.chosen) pick.isSure = false;
+  const auto found = tables(source, listItems, context);
+  if (!found) return false;
+  const bool areInvariant =
+      std::all_of(_condition.outward.begin(), _condition.outward.end(),
+                  [&](const XQueryFacts& facts) { return isInvariantInRound(facts, context); });
+  if (!areInvariant || anyFails(_condition.needed, context)) return false;
+  const Truth guards = truthOf(_condition.guards, context);
+  if (guards == Truth::Failure) return false;
+  if (guards == Truth::No && _condition.terms.front().relation.isComplement) return false;
+  std::vector<Asked> asked;
+  if (!askEach(*found, guards == Truth::Yes, context, asked)) return false;
+  const bool areAll = asked.size() == _condition.terms.size();
+  select(asked, areAll && _condition.isWhole, picks);
+  picks.items = found->items;
+  found->picked += picks.chosen.size();
+  if (!areAll && !found->areAllTried() && found->picked >= found->items->size()) {
+    addTable(*found, context);
   }
-  picks.items = std::shared_ptr<const std::vector<Value>>(found, &found->items());
   return true;
 }
 
-// The table that is kept, or one made when it is worth it; null for the plain way.
-std::shared_ptr<XQueryJoinTable> XQueryJoin::table(const Value& source, const Lister& listItems,
-                                                   XQueryContext& context) const {
+// The tables that are kept, or new ones when they are worth it; null for the plain way.
+std::shared_ptr<XQueryJoin::Tables> XQueryJoin::tables(const Value& source, const Lister& listItems,
+                                                       XQueryContext& context) const {
   auto& keptValues = context._internal().keptValues();
   if (keptValues.looksAway(_owner)) return nullptr;
   std::shared_ptr<XQueryKeptValue> kept;
@@ -115,54 +149,135 @@ std::shared_ptr<XQueryJoinTable> XQueryJoin::table(const Value& source, const Li
     case XQueryKeptValues::Use::First:
       return nullptr;
     case XQueryKeptValues::Use::Second: {
-      auto made = makeTable(listItems, context);
-      if (made && !made->isComplete()) made = nullptr;
+      auto made = makeTables(listItems, context);
       keptValues.keep(_owner, {&source, 1}, made);
       return made;
     }
     case XQueryKeptValues::Use::Further:
       break;
   }
-  return std::static_pointer_cast<XQueryJoinTable>(kept);
+  return std::static_pointer_cast<Tables>(kept);
 }
 
-std::shared_ptr<XQueryJoinTable> XQueryJoin::makeTable(const Lister& listItems,
-                                                       XQueryContext& context) const {
-  std::vector<Value> items;
-  if (!listItems(items)) return nullptr;
-  if (items.size() < XQueryJoinTable::fewestItems || items.size() > XQueryJoinTable::mostItems) {
+std::shared_ptr<XQueryJoin::Tables> XQueryJoin::makeTables(const Lister& listItems,
+                                                           XQueryContext& context) const {
+  auto items = std::make_shared<std::vector<Value>>();
+  if (!listItems(*items)) return nullptr;
+  if (items->size() < XQueryJoinTable::fewestItems || items->size() > XQueryJoinTable::mostItems) {
     return nullptr;
   }
-  if (_condition.looksOutOfItems && !XQueryAreSettled(items, true)) return nullptr;
-  auto& dynamic = context._internal();
-  const Value item = dynamic.contextItem();
-  const int64_t position = dynamic.position();
-  auto made = std::make_shared<XQueryJoinTable>(_condition.relation, items, [&](size_t index) {
-    return keyOf(items[index], index, context);
-  });
-  if (_varID == 0) dynamic.setContextItem(item, position);
-  return made;
+  if (_condition.looksOutOfItems && !XQueryAreSettled(*items, true)) return nullptr;
+  auto made = std::make_shared<Tables>(std::move(items), _condition.terms.size());
+  return addTable(*made, context) ? made : nullptr;
 }
 
-Value XQueryJoin::keyOf(const Value& item, size_t position, XQueryContext& context) const {
+// Makes the next table that can be made, if any.
+bool XQueryJoin::addTable(Tables& tables, XQueryContext& context) const {
+  const auto& items = *tables.items;
+  const auto& terms = _condition.terms;
+  tables.picked = 0;
+  while (!tables.areAllTried()) {
+    const size_t term = tables.next++;
+    const bool looksOut = std::any_of(terms.begin(), terms.end(), [&](const XQueryJoinTerm& each) {
+      return each.looksOutOfItems && (each.mustNotFail || &each == &terms[term]);
+    });
+    // Without a table that must answer there are none behind it.
+    const size_t nextOfAll = tables.next;
+    if (terms[term].mustAnswer) tables.next = terms.size();
+    if (looksOut && !XQueryAreSettled(items, true)) continue;
+    auto& dynamic = context._internal();
+    const Value item = dynamic.contextItem();
+    const int64_t position = dynamic.position();
+    auto made =
+        std::make_unique<XQueryJoinTable>(terms[term].relation, tables.items, [&](size_t index) {
+          if (!tables.answersFor(index, _condition)) return Value();
+          return keyOf(items[index], index, term, context);
+        });
+    if (_varID == 0) dynamic.setContextItem(item, position);
+    if (!made->isComplete()) continue;
+    tables.next = nextOfAll;
+    tables.byTerm[term] = std::move(made);
+    return true;
+  }
+  return false;
+}
+
+Value XQueryJoin::keyOf(const Value& item, size_t position, size_t term,
+                        XQueryContext& context) const {
   auto& dynamic = context._internal();
   if (_varID != 0) {
     dynamic.setVariable(item, _varID);
   } else {
     dynamic.setContextItem(item, static_cast<int64_t>(position) + 1);
   }
-  const bool checksFail =
-      std::any_of(_condition.checks.begin(), _condition.checks.end(),
-                  [&](const auto& expr) { return !valueOrNull(*expr, context); });
-  if (checksFail) return {};
-  switch (answerOf(_condition.filters, context)) {
-    case Answer::Yes:
-      return valueOrNull(*_condition.key, context);
-    case Answer::No:  // as an item without a key, it meets nothing
+  if (anyFails(_condition.checks, context)) return {};
+  Value key;
+  for (const XQueryJoinTerm& each : _condition.terms) {
+    if (!each.mustNotFail) continue;
+    Value read = valueOrNull(*each.key, context);
+    if (!read) return {};
+    if (&each == &_condition.terms[term]) key = std::move(read);
+  }
+  switch (truthOf(_condition.filters, context)) {
+    case Truth::Yes:
+      return key ? key : valueOrNull(*_condition.terms[term].key, context);
+    case Truth::No:  // as an item without a key, it meets nothing
       return Value(NSNull::null());
     default:
       return {};
   }
+}
+
+// Makes the questions for those tables that can be asked; false for the plain way. Without probes,
+// which is how nothing is met, what may be an error has still to be asked.
+bool XQueryJoin::askEach(const Tables& tables, bool withProbes, XQueryContext& context,
+                         std::vector<Asked>& asked) const {
+  for (size_t index = 0; index < tables.byTerm.size(); ++index) {
+    const XQueryJoinTerm& term = _condition.terms[index];
+    XQueryJoinTable* table = tables.byTerm[index].get();
+    if (!table && !(term.mustNotFail && withProbes)) continue;
+    if (term.outward && !isInvariantInRound(*term.outward, context)) {
+      if (term.mustNotFail) return false;
+      if (term.mustAnswer) break;
+      continue;
+    }
+    const Value probe = withProbes ? valueOrNull(*term.probe, context) : NSNull::null();
+    if (!probe && term.mustNotFail) return false;
+    auto question = table ? table->questionOf(probe) : std::nullopt;
+    const bool answers = question && table->isRegularFor(*question);
+    if (question) asked.push_back({table, std::move(*question)});
+    if (term.mustAnswer && !answers) break;
+  }
+  return !asked.empty();
+}
+
+// The table that the fewest items meet picks, and the others are asked of these.
+void XQueryJoin::select(std::vector<Asked>& asked, bool areSure, XQueryPicks& picks) {
+  const auto isFewer = [](Asked& a, Asked& b) {
+    return a.table->estimateFor(a.question) < b.table->estimateFor(b.question);
+  };
+  if (asked.size() > 1) {
+    std::iter_swap(asked.begin(), std::min_element(asked.begin(), asked.end(), isFewer));
+  }
+  const bool wantsFirst = picks.wantsFirst && areSure;
+  asked.front().table->select(asked.front().question, picks.chosen,
+                              wantsFirst && asked.size() == 1);
+  if (asked.size() == 1 && areSure) return;
+  WorkPacer pacer;
+  size_t count = 0;
+  for (const XQueryPick& pick : picks.chosen) {
+    pacer.turn();
+    bool isSure = pick.isSure;
+    const bool isExcluded = std::any_of(asked.begin() + 1, asked.end(), [&](Asked& each) {
+      const auto isMet = each.table->isMetBy(each.question, pick.position);
+      isSure = isSure && isMet;
+      return isMet == false;
+    });
+    if (isExcluded) continue;
+    picks.chosen[count++] = {pick.position, isSure && areSure};
+    if (wantsFirst && isSure) break;
+  }
+  picks.chosen.resize(count);
 }
 
 }  // namespace xquery

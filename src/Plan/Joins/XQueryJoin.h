@@ -1,5 +1,7 @@
 // Joins: a clause or a step whose items are asked a comparison of a key with a probe finds those
-// that meet it in a table of the keys when it is evaluated again over the same items. The plain way
+// that meet it in a table of the keys when it is evaluated again over the same items. Of several
+// comparisons joined by "and" the one that is met by the fewest items finds them, and the others
+// are asked of these. The plain way
 // evaluates the comparison for every item each time, which makes a join of two lists take as many
 // comparisons as there are pairs.
 //
@@ -17,6 +19,7 @@
 #include <cstdint>
 #include <memory>
 #include <utility>
+#include <vector>
 
 namespace xquery {
 
@@ -41,11 +44,17 @@ class XQueryJoin final : public XQueryPicker {
         _condition(std::move(condition)),
         _looksAroundSource(looksAround) {}
 
-  bool isInvariantInRound(XQueryContext& context) const;
-  std::shared_ptr<XQueryJoinTable> table(const Value& source, const Lister& listItems,
-                                         XQueryContext& context) const;
-  std::shared_ptr<XQueryJoinTable> makeTable(const Lister& listItems, XQueryContext& context) const;
-  Value keyOf(const Value& item, size_t position, XQueryContext& context) const;
+  class Tables;
+  struct Asked;
+
+  std::shared_ptr<Tables> tables(const Value& source, const Lister& listItems,
+                                 XQueryContext& context) const;
+  std::shared_ptr<Tables> makeTables(const Lister& listItems, XQueryContext& context) const;
+  bool addTable(Tables& tables, XQueryContext& context) const;
+  Value keyOf(const Value& item, size_t position, size_t term, XQueryContext& context) const;
+  bool askEach(const Tables& tables, bool withProbes, XQueryContext& context,
+               std::vector<Asked>& asked) const;
+  static void select(std::vector<Asked>& asked, bool areSure, XQueryPicks& picks);
 
   const XQueryExpr& _owner;
   const int64_t _varID;  // 0: the item is the context item

@@ -15,6 +15,7 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <iterator>
 #include <optional>
 #include <utility>
 
@@ -318,9 +319,31 @@ std::vector<XQueryJoinClause> XQueryJoinSearch::clausesBefore(const XQueryFacts&
   return found;
 }
 
+// What has been passed on the way to a comparison.
+struct XQueryJoinSearch::Before {
+  XQueryJoinCondition others;
+  // Terms with operands that may fail, by their numbers.
+  std::vector<size_t> failing;
+  // There is something else, which cannot make a difference for items that are left out.
+  bool holdsMore = false;
+  // There is a term that must answer.
+  bool holdsAnswer = false;
+
+  // The condition has a term behind all this.
+  void addTo(XQueryJoinCondition& condition) const {
+    condition.filters = others.filters;
+    condition.guards = others.guards;
+    condition.checks = others.checks;
+    condition.needed = others.needed;
+    condition.looksOutOfItems = others.looksOutOfItems;
+    condition.outward = others.outward;
+    for (const size_t term : failing) condition.terms[term].mustNotFail = true;
+  }
+};
+
 // Another comparison of the item, which fails only where one of its operands does.
 bool XQueryJoinSearch::passComparison(XQueryPlaceID place, const XQueryJoinScope& scope,
-                                      XQueryJoinCondition& before) const {
+                                      Before& before) const {
   const auto* comparison = dyn_cast<XQueryOperatorExpr>(at(place).expr);
   if (!comparison || !relationCode(comparison->operatorType())) return false;
   const XQueryPlaceID left = _planning.program.firstPart(place);
@@ -333,101 +356,160 @@ bool XQueryJoinSearch::passComparison(XQueryPlaceID place, const XQueryJoinScope
   const bool isValueComparison = comparison->operatorType() >= XQueryOperatorEq;
   if (isValueComparison && (facts(left).most > 1 || facts(right).most > 1)) return false;
   if (!are(texts) && !are(XQueryItems::Numeric)) return false;
+  XQueryJoinCondition& others = before.others;
   for (const XQueryPlaceID operand : {left, right}) {
     const XQueryJoinReads reads = scope.readsOf(facts(operand));
     if (reads == XQueryJoinReads::Unknown) return false;
     if (!facts(operand).does(XQueryDeeds::MayFail)) continue;
     const bool looksOut = facts(operand).does(XQueryDeeds::ReadsOutside);
     if (reads == XQueryJoinReads::Item) {
-      before.checks.push_back(_planning.exprAt(operand));
-      before.looksOutOfItems = before.looksOutOfItems || looksOut;
+      others.checks.push_back(_planning.exprAt(operand));
+      others.looksOutOfItems = others.looksOutOfItems || looksOut;
     } else {
-      before.needed.push_back(_planning.exprAt(operand));
-      if (looksOut) before.outward.push_back(facts(operand));
+      others.needed.push_back(_planning.exprAt(operand));
+      if (looksOut) others.outward.push_back(facts(operand));
     }
   }
   return true;
 }
 
-XQueryJoinCondition XQueryJoinSearch::made(const Comparison& comparison) const {
-  XQueryJoinCondition condition;
-  condition.key = comparison.key;
-  condition.relation = comparison.relation;
+// A condition is asked of the item before the clauses that follow from it.
+XQueryJoinScope XQueryJoinSearch::ofItemOnly() const {
+  XQueryJoinScope scope = _scope;
+  for (const XQueryJoinClause& clause : _clauses) scope.item.remove(clause.varID);
+  return scope;
+}
+
+// Whether what is behind a condition may exclude items; adds what has to be asked beforehand.
+bool XQueryJoinSearch::pass(XQueryPlaceID place, Before& before) const {
+  const XQueryFacts& parts = facts(place);
+  const bool looksOut = parts.does(XQueryDeeds::ReadsOutside);
+  XQueryJoinCondition& others = before.others;
+  if (before.holdsAnswer) {
+    before.holdsMore = true;
+    return cannotFail(place);
+  }
+  const XQueryJoinScope itemOnly = ofItemOnly();
+  switch (itemOnly.readsOf(parts)) {
+    case XQueryJoinReads::Item:
+      others.filters.push_back(_planning.exprAt(place));
+      others.looksOutOfItems = others.looksOutOfItems || looksOut;
+      return true;
+    case XQueryJoinReads::Round:
+      others.guards.push_back(_planning.exprAt(place));
+      if (looksOut) others.outward.push_back(parts);
+      return true;
+    default:
+      before.holdsMore = true;
+      return cannotFail(place) || passComparison(place, itemOnly, before);
+  }
+}
+
+// The same for the comparison of the last term.
+bool XQueryJoinSearch::passTerm(XQueryPlaceID place, const Comparison& comparison,
+                                XQueryJoinCondition& condition, Before& before) const {
+  Before ofTerm;
+  if (passComparison(place, _scope, ofTerm)) {
+    const bool mayFail = !ofTerm.others.checks.empty() || !ofTerm.others.needed.empty();
+    if (mayFail) before.failing.push_back(condition.terms.size() - 1);
+    return true;
+  }
+  if (!comparison.isWhole) return false;
+  condition.terms.back().mustAnswer = true;
+  before.holdsAnswer = true;
+  return true;
+}
+
+XQueryJoinTerm XQueryJoinSearch::made(const Comparison& comparison) const {
+  XQueryJoinTerm term;
+  term.key = comparison.key;
+  term.relation = comparison.relation;
   auto clauses = clausesBefore(comparison.keyFacts);
   for (const XQueryJoinClause& clause : clauses) {
     const bool looksOut = clause.facts.does(XQueryDeeds::ReadsOutside);
-    condition.looksOutOfItems = condition.looksOutOfItems || looksOut;
+    term.looksOutOfItems = term.looksOutOfItems || looksOut;
   }
   if (!clauses.empty()) {
     const bool hasLoops = std::any_of(clauses.begin(), clauses.end(),
                                       [](const auto& clause) { return clause.isLoop; });
     const bool isOfEach = hasLoops && comparison.relation.isValueComparison;
-    condition.relation.keysAreOfEach = condition.relation.keysAreOfEach || isOfEach;
-    condition.key = XQueryJoinKeys::exprWithClauses(std::move(clauses), condition.key, isOfEach);
+    term.relation.keysAreOfEach = term.relation.keysAreOfEach || isOfEach;
+    term.key = XQueryJoinKeys::exprWithClauses(std::move(clauses), term.key, isOfEach);
   }
-  condition.probe = comparison.probe;
-  condition.promise = promiseOf(comparison.relation.relation, comparison.probeFacts);
-  condition.looksOutOfItems =
-      condition.looksOutOfItems || comparison.keyFacts.does(XQueryDeeds::ReadsOutside);
-  if (comparison.probeFacts.does(XQueryDeeds::ReadsOutside)) {
-    condition.outward.push_back(comparison.probeFacts);
-  }
-  return condition;
+  term.probe = comparison.probe;
+  term.promise = promiseOf(comparison.relation.relation, comparison.probeFacts);
+  term.looksOutOfItems =
+      term.looksOutOfItems || comparison.keyFacts.does(XQueryDeeds::ReadsOutside);
+  if (comparison.probeFacts.does(XQueryDeeds::ReadsOutside)) term.outward = comparison.probeFacts;
+  return term;
 }
 
 XQueryJoinCondition XQueryJoinSearch::conditionIn(XQueryPlaceID place, bool errorExcludes) const {
+  // What is compared with the same in every round is asked once of each item, unless there is
+  // nothing else to find items by.
+  XQueryJoinCondition found = termsIn(place, errorExcludes, false);
+  return found.terms.empty() ? termsIn(place, errorExcludes, true) : found;
+}
+
+XQueryJoinCondition XQueryJoinSearch::termsIn(XQueryPlaceID place, bool errorExcludes,
+                                              bool takesConstants) const {
+  const XQueryJoinScope itemOnly = ofItemOnly();
   const auto all = conjuncts(place);
-  XQueryJoinCondition best;
-  // What has been passed on the way.
-  XQueryJoinCondition before;
-  bool passedOther = false;
+  XQueryJoinCondition found;
+  Before before;
+  bool areAllPassed = !all.empty();
   for (const XQueryPlaceID conjunct : all) {
     const XQueryFacts& parts = facts(conjunct);
-    if (!parts.isRepeatable()) break;
     // The plain way, which came first, has fetched what the first condition asks for of each item,
     // and may not have come to the others.
     const bool loads = parts.does(XQueryDeeds::LoadsDocuments);
-    if (loads && conjunct != all.front()) break;
-    const Comparison found = comparisonAt(conjunct);
-    if (found.key) {
-      XQueryJoinCondition condition = made(found);
-      if (condition.promise > best.promise) {
-        condition.isWhole = found.isWhole && conjunct == all.back() && !passedOther &&
-                            before.filters.size() + before.guards.size() + 1 == all.size();
-        condition.filters = before.filters;
-        condition.guards = before.guards;
-        condition.checks = before.checks;
-        condition.needed = before.needed;
-        condition.looksOutOfItems = condition.looksOutOfItems || before.looksOutOfItems;
-        condition.outward.insert(condition.outward.end(), before.outward.begin(),
-                                 before.outward.end());
-        best = std::move(condition);
-      }
+    areAllPassed = parts.isRepeatable() && (!loads || conjunct == all.front());
+    if (!areAllPassed) break;
+    const Comparison comparison = comparisonAt(conjunct);
+    XQueryJoinTerm term;
+    if (comparison.key) term = made(comparison);
+    const bool isFilter =
+        !takesConstants && !errorExcludes && itemOnly.readsOf(parts) == XQueryJoinReads::Item;
+    const bool isTerm = term.promise > 0 && !isFilter;
+    if (isTerm) {
+      before.addTo(found);
+      before.holdsMore = before.holdsMore || !comparison.isWhole;
+      found.terms.push_back(std::move(term));
     }
     if (errorExcludes) {
-      passedOther = true;
+      before.holdsMore = before.holdsMore || !isTerm;
+      areAllPassed = !loads || all.size() == 1;
       if (loads) break;
       continue;
     }
-    const bool outside = parts.does(XQueryDeeds::ReadsOutside);
-    // A filter is asked of the item before the clauses that follow from it.
-    XQueryJoinScope itemOnly = _scope;
-    for (const XQueryJoinClause& clause : _clauses) itemOnly.item.remove(clause.varID);
-    const XQueryJoinReads read = itemOnly.readsOf(parts);
-    if (read == XQueryJoinReads::Item) {
-      before.filters.push_back(_planning.exprAt(conjunct));
-      before.looksOutOfItems = before.looksOutOfItems || outside;
-    } else if (read == XQueryJoinReads::Round) {
-      before.guards.push_back(_planning.exprAt(conjunct));
-      if (outside) before.outward.push_back(parts);
-    } else if (cannotFail(conjunct) || passComparison(conjunct, itemOnly, before)) {
-      passedOther = true;
-    } else {
-      break;
+    if (!isTerm) {
+      areAllPassed = pass(conjunct, before);
+    } else if (conjunct != all.back() && !cannotFail(conjunct)) {
+      areAllPassed = passTerm(conjunct, comparison, found, before);
     }
+    if (!areAllPassed) break;
   }
-  if (best.key) best.assigns = facts(place).assigns;
-  return best;
+  if (found.terms.empty()) return found;
+  // What is behind the last term excludes items as well where that makes the condition whole.
+  found.isWhole = areAllPassed && !before.holdsMore;
+  if (found.isWhole) before.addTo(found);
+  found.putBestFirst();
+  found.assigns = facts(place).assigns;
+  return found;
+}
+
+void XQueryJoinCondition::putBestFirst() {
+  if (std::any_of(terms.begin(), terms.end(), [](const auto& term) { return term.mustAnswer; })) {
+    return;
+  }
+  std::stable_sort(terms.begin(), terms.end(),
+                   [](const auto& a, const auto& b) { return a.promise > b.promise; });
+}
+
+void XQueryJoinCondition::join(XQueryJoinCondition other) {
+  isWhole = isWhole && other.isWhole;
+  std::move(other.terms.begin(), other.terms.end(), std::back_inserter(terms));
+  putBestFirst();
 }
 
 XQueryJoinCondition XQueryJoinSearch::complementIn(XQueryPlaceID place) const {
@@ -442,8 +524,9 @@ XQueryJoinCondition XQueryJoinSearch::complementIn(XQueryPlaceID place) const {
   if (!found.key || !_clauses.empty() || found.relation.isIdentity) return {};
   found.relation.relation.negated = !found.relation.relation.negated;
   found.relation.isComplement = true;
-  XQueryJoinCondition condition = made(found);
-  if (condition.promise == 0) return {};
+  XQueryJoinCondition condition;
+  condition.terms.push_back(made(found));
+  if (condition.terms.front().promise == 0) return {};
   condition.isWhole = true;
   condition.assigns = facts(place).assigns;
   return condition;

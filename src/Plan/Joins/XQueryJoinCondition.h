@@ -7,6 +7,7 @@
 #include "Plan/Joins/XQueryJoinTable.h"
 #include "Plan/Planning.h"
 
+#include <optional>
 #include <utility>
 #include <vector>
 
@@ -28,28 +29,47 @@ struct XQueryJoinScope {
   XQueryJoinReads readsOf(const XQueryFacts& facts) const;
 };
 
-struct XQueryJoinCondition {
-  Ref<XQueryExpr> key;  // null when there is no such comparison
+// One comparison.
+struct XQueryJoinTerm {
+  Ref<XQueryExpr> key;
   Ref<XQueryExpr> probe;
   XQueryJoinRelation relation;
-  // How much it promises to exclude; 0 for none.
+  // How much it promises to exclude, never 0.
   int promise = 0;
-  // The comparison, filters and guards are the whole condition.
+  // What is behind it excludes items as well: neither key nor probe may fail where it does.
+  bool mustNotFail = false;
+  // Terms behind it may exclude those items only for which its own table has an answer.
+  bool mustAnswer = false;
+  // The key looks outside the item.
+  bool looksOutOfItems = false;
+  // What the probe reads where it looks outside the nodes that it starts from.
+  std::optional<XQueryFacts> outward;
+};
+
+struct XQueryJoinCondition {
+  // Joined by "and"; none when there is no comparison. The one that promises most is the first,
+  // unless one must answer: then they are in their order.
+  std::vector<XQueryJoinTerm> terms;
+  // The terms, filters and guards are the whole condition.
   bool isWhole = false;
-  // The conditions before the comparison, all joined by "and": those that read the item only, and
-  // those that do not read it.
+  // What else there is up to the last term, all joined by "and": conditions that read the item
+  // only, and those that do not read it.
   std::vector<Ref<XQueryExpr>> filters;
   std::vector<Ref<XQueryExpr>> guards;
   // What would be evaluated for an item that is left out, and must not fail: what reads the item
   // only, and what does not read it.
   std::vector<Ref<XQueryExpr>> checks;
   std::vector<Ref<XQueryExpr>> needed;
-  // Key and filters look outside the item.
+  // Filters and checks look outside the item.
   bool looksOutOfItems = false;
-  // What those of the probe and the guards read that look outside the nodes they start from.
+  // What those of the guards and the needed read that look outside the nodes they start from.
   std::vector<XQueryFacts> outward;
   // Local variables that evaluating any of this sets.
   XQueryVariableSet assigns;
+
+  // Another condition holds as well, and an error in either excludes an item.
+  void join(XQueryJoinCondition other);
+  void putBestFirst();
 };
 
 // Finds the comparisons of a condition.
@@ -59,11 +79,11 @@ class XQueryJoinSearch {
                    std::vector<XQueryJoinClause> clauses)
       : _planning(planning), _scope(scope), _clauses(std::move(clauses)) {}
 
-  // Of several comparisons joined by "and" the one that promises to exclude most. An item that it
-  // excludes is excluded by the whole condition: where an error excludes as well (`errorExcludes`)
-  // because what stands before it is repeatable and what stands behind it cannot tell whether there
-  // was an error, and otherwise because what stands before it reads the item only, or does not read
-  // it, or cannot fail.
+  // The comparisons, of those joined by "and", that can pick items. An item that one excludes is
+  // excluded by the whole condition: where an error excludes as well (`errorExcludes`) because what
+  // stands before it is repeatable and what stands behind it cannot tell whether there was an
+  // error, and otherwise because what stands before it reads the item only, or does not read it, or
+  // cannot fail.
   XQueryJoinCondition conditionIn(XQueryPlaceID place, bool errorExcludes) const;
   // The same where the items are picked for which the condition may not hold.
   XQueryJoinCondition complementIn(XQueryPlaceID place) const;
@@ -88,10 +108,15 @@ class XQueryJoinSearch {
                           Operand& operand) const;
   Comparison comparisonOfSome(XQueryPlaceID place) const;
   bool cannotFail(XQueryPlaceID place) const;
-  bool passComparison(XQueryPlaceID place, const XQueryJoinScope& scope,
-                      XQueryJoinCondition& before) const;
+  struct Before;
+  XQueryJoinScope ofItemOnly() const;
+  XQueryJoinCondition termsIn(XQueryPlaceID place, bool errorExcludes, bool takesConstants) const;
+  bool pass(XQueryPlaceID place, Before& before) const;
+  bool passTerm(XQueryPlaceID place, const Comparison& comparison, XQueryJoinCondition& condition,
+                Before& before) const;
+  bool passComparison(XQueryPlaceID place, const XQueryJoinScope& scope, Before& before) const;
   std::vector<XQueryJoinClause> clausesBefore(const XQueryFacts& key) const;
-  XQueryJoinCondition made(const Comparison& comparison) const;
+  XQueryJoinTerm made(const Comparison& comparison) const;
 
   const XQueryPlanning& _planning;
   const XQueryJoinScope _scope;

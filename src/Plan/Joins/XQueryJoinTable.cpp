@@ -13,7 +13,7 @@
 #include <cmath>
 #include <functional>
 #include <limits>
-#include <type_traits>
+#include <numeric>
 
 namespace xquery {
 namespace {
@@ -34,17 +34,15 @@ bool isExactAsDouble(const NSNumber& number) {
   return std::abs(number.doubleValue()) < exactIntegerBound;
 }
 
-uint32_t hashOfDouble(double value) {
+uint32_t hashOf(double value) {
   // The two zeros are equal.
   return static_cast<uint32_t>(keyedHash(std::bit_cast<uint64_t>(value == 0 ? 0.0 : value)));
 }
-
-uint32_t hashOfNode(const NSObject* node) {
-  return static_cast<uint32_t>((reinterpret_cast<uintptr_t>(node) * 0x9E3779B97F4A7C15U) >> 32U);
-}
-
-uint32_t hashOfText(NSStringView text) {
+uint32_t hashOf(NSStringView text) {
   return text.hash();
+}
+uint32_t hashOf(const NSObject* node) {
+  return static_cast<uint32_t>((reinterpret_cast<uintptr_t>(node) * 0x9E3779B97F4A7C15U) >> 32U);
 }
 
 int orderOf(double a, double b) {
@@ -59,10 +57,19 @@ bool isEqual(double a, double b) {
 bool isEqual(NSStringView a, NSStringView b) {
   return a.equals(b);
 }
+int orderOf(const NSObject* a, const NSObject* b) {
+  return std::less<>()(a, b) ? -1 : std::less<>()(b, a) ? 1 : 0;
+}
+bool isEqual(const NSObject* a, const NSObject* b) {
+  return a == b;
+}
 bool meetsNothing(double key) {
   return std::isnan(key);
 }
 bool meetsNothing(NSStringView) {
+  return false;
+}
+bool meetsNothing(const NSObject*) {
   return false;
 }
 
@@ -93,6 +100,13 @@ void keepDistinct(std::vector<Key>& probes) {
   });
   const auto areEqual = [](const Key& a, const Key& b) { return isEqual(a, b); };
   probes.erase(std::unique(probes.begin(), probes.end(), areEqual), probes.end());
+}
+
+// Of the probes those that decide.
+template <class Key>
+void keepDeciding(XQueryRelation relation, std::vector<Key>& probes) {
+  if (relation.test == XQueryRelation::Equal) return keepDistinct(probes);
+  if (!probes.empty()) probes.assign(1, decidingProbe(relation, probes));
 }
 
 // In the order of the items, each once; an item that has to be asked stays one.
@@ -134,24 +148,31 @@ bool XQueryJoinTable::Operand::isNaN() const {
   return kind == Floating && std::isnan(number);
 }
 
-template <class HashOf>
-void XQueryJoinTable::Chains::build(size_t count, HashOf hashOf) {
-  _heads.assign(std::bit_ceil(2 * count + 1), end);
-  _next.assign(count, end);
+template <class Key>
+void XQueryJoinTable::Buckets::build(const std::vector<Key>& keys) {
+  const size_t buckets = std::bit_ceil(2 * keys.size() + 1);
+  _starts.assign(buckets + 1, 0);
+  _keys.resize(keys.size());
+  std::vector<uint32_t> bucketOf(keys.size());
   WorkPacer pacer;
-  // From the last key on, so that a chain begins with the first one.
-  for (size_t key = count; key-- > 0;) {
+  for (size_t key = 0; key < keys.size(); ++key) {
     pacer.turn();
-    uint32_t& head = _heads[hashOf(key) & (_heads.size() - 1)];
-    _next[key] = head;
-    head = static_cast<uint32_t>(key);
+    bucketOf[key] = static_cast<uint32_t>(hashOf(keys[key]) & (buckets - 1));
+    ++_starts[bucketOf[key] + 1];
   }
+  std::partial_sum(_starts.begin(), _starts.end(), _starts.begin());
+  // From the last key on: where a bucket ends goes back to where it starts.
+  for (size_t key = keys.size(); key-- > 0;) {
+    pacer.turn();
+    _keys[--_starts[bucketOf[key] + 1]] = static_cast<uint32_t>(key);
+  }
+  _starts.erase(_starts.begin());
+  _starts.push_back(static_cast<uint32_t>(keys.size()));
 }
 
 // --- filling -------------------------------------------------------------------------------------
 
-XQueryJoinTable::XQueryJoinTable(const XQueryJoinRelation& by, std::vector<Value> items,
-                                 const KeyReader& keyOf)
+XQueryJoinTable::XQueryJoinTable(const XQueryJoinRelation& by, Items items, const KeyReader& keyOf)
     : _relation(by.relation),
       _isValueComparison(by.isValueComparison),
       _isComplement(by.isComplement),
@@ -169,7 +190,7 @@ XQueryJoinTable::~XQueryJoinTable() {
 
 void XQueryJoinTable::readKeys(const KeyReader& keyOf) {
   const int64_t bytesBefore = workMeter.valueBytes;
-  for (size_t index = 0; index < _items.size() && _isComplete; ++index) {
+  for (size_t index = 0; index < _items->size() && _isComplete; ++index) {
     checkWork();
     read(static_cast<uint32_t>(index), keyOf(index));
     _isComplete = !isTooLarge(bytesBefore);
@@ -178,12 +199,13 @@ void XQueryJoinTable::readKeys(const KeyReader& keyOf) {
 
 // `bytesBefore`: what all values took before the first key was read.
 bool XQueryJoinTable::isTooLarge(int64_t bytesBefore) const {
-  if (_keys.size() > std::max(keysOfAnyItems, _items.size() * mostKeysPerItem)) return true;
+  if (_keys.size() > std::max(keysOfAnyItems, _items->size() * mostKeysPerItem)) return true;
   // With both ways of finding it.
   constexpr size_t bytesPerKey = sizeof(Operand) + sizeof(Value) + sizeof(NSStringView) +
                                  sizeof(double) + 12 * sizeof(uint32_t);
   constexpr int64_t part = 4;
-  const auto own = static_cast<int64_t>(_items.size() * sizeof(Value) + _keys.size() * bytesPerKey);
+  const auto own =
+      static_cast<int64_t>(_items->size() * sizeof(Value) + _keys.size() * bytesPerKey);
   const int64_t keyBytes = workMeter.valueBytes - bytesBefore;
   return own + keyBytes > workMeter.mostValueBytes / part - bytesBefore / part;
 }
@@ -212,7 +234,8 @@ void XQueryJoinTable::read(uint32_t position, const Value& value) {
 bool XQueryJoinTable::readNode(uint32_t position, const XQueryItemList& keys) {
   if (keys.count() == 0) return true;
   if (keys.count() > 1 || !keys[0]->isNode()) return false;
-  _nodes.emplace_back(keys[0]);
+  _keptKeys.emplace_back(keys[0]);
+  _nodes.push_back(keys[0]);
   _positions.push_back(position);
   return true;
 }
@@ -248,13 +271,13 @@ void XQueryJoinTable::scanTexts() {
 }
 
 void XQueryJoinTable::countMemory() {
-  const size_t bytes = _items.size() * sizeof(Value) + _keptKeys.size() * sizeof(Value) +
-                       _keys.size() * sizeof(Operand) + _nodes.size() * sizeof(Value) +
-                       _nodeChains.bytes() +
-                       (_positions.size() + _irregular.size()) * sizeof(uint32_t) +
-                       _texts.size() * sizeof(NSStringView) + _numbers.size() * sizeof(double) +
-                       _textChains.bytes() + _numberChains.bytes() +
-                       (_textOrder.keys.size() + _numberOrder.keys.size()) * sizeof(uint32_t);
+  const size_t bytes =
+      _items->size() * sizeof(Value) + _keptKeys.size() * sizeof(Value) +
+      _keys.size() * sizeof(Operand) + _nodes.size() * sizeof(const NSObject*) +
+      _nodeBuckets.bytes() + _textBuckets.bytes() + _numberBuckets.bytes() +
+      (_positions.size() + _irregular.size() + _firstKeys.size()) * sizeof(uint32_t) +
+      _texts.size() * sizeof(NSStringView) + _numbers.size() * sizeof(double) +
+      (_textOrder.keys.size() + _numberOrder.keys.size()) * sizeof(uint32_t);
   const int64_t more = static_cast<int64_t>(bytes) - _countedBytes;
   if (more > 0) countValueBytes(static_cast<size_t>(more));
   _countedBytes = std::max(_countedBytes, static_cast<int64_t>(bytes));
@@ -265,6 +288,10 @@ void XQueryJoinTable::countMemory() {
 XQueryJoinTable::Way XQueryJoinTable::wayFor(const Value& probe, Operands& probes) const {
   if (!probe) return Way::Plain;
   const XQueryItemList list(probe.get());
+  if (_isIdentity) {
+    if (list.count() > 1 || (list.count() == 1 && !list[0]->isNode())) return Way::Plain;
+    return list.count() == 1 && !_nodes.empty() ? Way::Nodes : Way::Nothing;
+  }
   if (_wantsOneProbe && list.count() > 1) return Way::Plain;
   if (_isComplement && list.count() != 1) return Way::Plain;
   WorkPacer pacer;
@@ -280,71 +307,171 @@ XQueryJoinTable::Way XQueryJoinTable::wayFor(const Value& probe, Operands& probe
   return wayOfNumbers(probes);
 }
 
-bool XQueryJoinTable::selectNode(const XQueryItemList& probes, Selection& selection) {
-  if (probes.count() > 1 || (probes.count() == 1 && !probes[0]->isNode())) return false;
-  if (probes.count() == 1 && !_nodes.empty()) {
-    const NSObject* probe = probes[0];
-    if (!_nodeChains.isBuilt()) {
-      _nodeChains.build(_nodes.size(), [&](size_t key) { return hashOfNode(_nodes[key].get()); });
-    }
-    for (uint32_t key = _nodeChains.first(hashOfNode(probe)); key != Chains::end;
-         key = _nodeChains.next(key)) {
-      if (_nodes[key].get() == probe) selection.push_back({_positions[key], true});
-    }
+std::optional<XQueryJoinTable::Question> XQueryJoinTable::questionOf(const Value& probe) {
+  Question question;
+  question.way = wayFor(probe, question.operands);
+  if (question.way == Way::Plain) return std::nullopt;
+  question.probe = probe;
+  switch (question.way) {
+    case Way::Nodes:
+      question.nodes.push_back(XQueryItemList(probe.get())[0]);
+      break;
+    case Way::Texts:
+      readTexts();
+      for (const Operand& each : question.operands) question.texts.push_back(each.text.view());
+      keepDeciding(_relation, question.texts);
+      break;
+    case Way::Numbers:
+    case Way::NumbersButTies:
+      scanTexts();
+      for (Operand& each : question.operands) {
+        each.scan();
+        // NaN meets nothing.
+        if (!std::isnan(each.number)) question.numbers.push_back(each.number);
+      }
+      keepDeciding(_relation, question.numbers);
+      break;
+    default:
+      break;
   }
-  for (const uint32_t position : _irregular) selection.push_back({position, false});
-  arrange(selection);
-  countMemory();
-  return true;
+  return question;
 }
 
-bool XQueryJoinTable::select(const Value& probe, Selection& selection, bool wantsFirst) {
-  if (_isIdentity) return probe && selectNode(XQueryItemList(probe.get()), selection);
-  Operands probes;
-  const Way way = wayFor(probe, probes);
-  if (way == Way::Plain) return false;
-  const Asked asked = {way == Way::NumbersButTies, wantsFirst};
-  const auto choose = [&](size_t key, bool isTie) {
+template <class Visit>
+void XQueryJoinTable::forEachMet(const Question& question, bool wantsFirst, Visit visit) {
+  switch (question.way) {
+    case Way::Nodes:
+      return forEachEqual(_nodes, question.nodes, _nodeBuckets, false, visit);
+    case Way::Texts:
+      if (_relation.test == XQueryRelation::Equal) {
+        return forEachEqual(_texts, question.texts, _textBuckets, false, visit);
+      }
+      return forEachOrdered(_texts, question.texts, _textOrder, {false, wantsFirst}, visit);
+    case Way::Numbers:
+    case Way::NumbersButTies: {
+      const bool areTiesOpen = question.way == Way::NumbersButTies;
+      if (_relation.test == XQueryRelation::Equal) {
+        return forEachEqual(_numbers, question.numbers, _numberBuckets, areTiesOpen, visit);
+      }
+      return forEachOrdered(_numbers, question.numbers, _numberOrder, {areTiesOpen, wantsFirst},
+                            visit);
+    }
+    default:
+      return;
+  }
+}
+
+void XQueryJoinTable::select(const Question& question, Selection& selection, bool wantsFirst) {
+  forEachMet(question, wantsFirst, [&](size_t key, bool isTie) {
     selection.push_back({_positions[key], !isTie});
     return true;
-  };
-  if (way == Way::Texts) {
-    readTexts();
-    forEachMet(_texts, textsOf(probes), _textChains, hashOfText, asked, choose);
-  } else if (way != Way::Nothing) {
-    scanTexts();
+  });
+  if (isOfNumbers(question)) {
     for (const uint32_t position : _irregularAsNumbers) selection.push_back({position, false});
-    forEachMet(_numbers, numbersOf(probes), _numberChains, hashOfDouble, asked, choose);
   }
   for (const uint32_t position : _irregular) selection.push_back({position, false});
   arrange(selection);
   countMemory();
-  return true;
 }
 
 std::optional<bool> XQueryJoinTable::meets(const Value& probe) {
   if (!_irregular.empty()) return std::nullopt;
-  Operands probes;
-  const Way way = wayFor(probe, probes);
-  if (way == Way::Plain) return std::nullopt;
-  const Asked asked = {way == Way::NumbersButTies, true};
+  const auto question = questionOf(probe);
+  if (!question || (isOfNumbers(*question) && !_irregularAsNumbers.empty())) return std::nullopt;
   bool areMet = false;
   bool isOpen = false;
-  const auto find = [&](size_t, bool isTie) {
+  forEachMet(*question, true, [&](size_t, bool isTie) {
     (isTie ? isOpen : areMet) = true;
     return !areMet;
-  };
-  if (way == Way::Texts) {
-    readTexts();
-    forEachMet(_texts, textsOf(probes), _textChains, hashOfText, asked, find);
-  } else if (way != Way::Nothing) {
-    scanTexts();
-    if (!_irregularAsNumbers.empty()) return std::nullopt;
-    forEachMet(_numbers, numbersOf(probes), _numberChains, hashOfDouble, asked, find);
-  }
+  });
   countMemory();
   if (isOpen && !areMet) return std::nullopt;
   return areMet;
+}
+
+size_t XQueryJoinTable::estimateFor(const Question& question) {
+  switch (question.way) {
+    case Way::Nodes:
+      return 1;
+    case Way::Texts:
+      return estimate(_texts, question.texts, _textBuckets, _textOrder);
+    case Way::Numbers:
+    case Way::NumbersButTies:
+      return estimate(_numbers, question.numbers, _numberBuckets, _numberOrder);
+    default:
+      return 0;
+  }
+}
+
+template <class Key>
+size_t XQueryJoinTable::estimate(const std::vector<Key>& keys, const std::vector<Key>& probes,
+                                 Buckets& buckets, Order& order) {
+  if (probes.empty()) return 0;
+  if (_relation.test != XQueryRelation::Equal) {
+    if (order.keys.empty()) return keys.size() / 2;
+    return metInOrder(_relation, keys, probes.front(), order).size();
+  }
+  if (!buckets.isBuilt()) buckets.build(keys);
+  size_t count = 0;
+  for (const Key& probe : probes) count += buckets.at(hashOf(probe)).size();
+  return count;
+}
+
+std::optional<bool> XQueryJoinTable::isMetBy(const Question& question, uint32_t position) {
+  if (isIrregular(position)) return std::nullopt;
+  if (_firstKeys.empty()) findKeysOfItems();
+  switch (question.way) {
+    case Way::Nodes:
+      return isMet(_nodes, question.nodes, false, position);
+    case Way::Texts:
+      return isMet(_texts, question.texts, false, position);
+    case Way::Numbers:
+    case Way::NumbersButTies:
+      if (std::binary_search(_irregularAsNumbers.begin(), _irregularAsNumbers.end(), position)) {
+        return std::nullopt;
+      }
+      return isMet(_numbers, question.numbers, question.way == Way::NumbersButTies, position);
+    default:
+      return false;
+  }
+}
+
+template <class Key>
+std::optional<bool> XQueryJoinTable::isMet(const std::vector<Key>& keys,
+                                           const std::vector<Key>& probes, bool areTiesOpen,
+                                           uint32_t position) const {
+  if (probes.empty()) return false;
+  bool isOpen = false;
+  for (uint32_t key = _firstKeys[position]; key < _firstKeys[position + 1]; ++key) {
+    if (meetsNothing(keys[key])) continue;
+    if (_relation.test == XQueryRelation::Equal) {
+      const auto before = [](const Key& a, const Key& b) { return orderOf(a, b) < 0; };
+      if (!std::binary_search(probes.begin(), probes.end(), keys[key], before)) continue;
+      if (!areTiesOpen) return true;
+      isOpen = true;
+    } else {
+      const int order = orderOf(keys[key], probes.front());
+      if (areTiesOpen && order == 0) {
+        isOpen = true;
+      } else if (_relation.holds(order)) {
+        return true;
+      }
+    }
+  }
+  if (isOpen) return std::nullopt;
+  return false;
+}
+
+// The keys of an item stand in a row.
+void XQueryJoinTable::findKeysOfItems() {
+  _firstKeys.assign(_items->size() + 1, 0);
+  WorkPacer pacer;
+  for (const uint32_t position : _positions) {
+    pacer.turn();
+    ++_firstKeys[position + 1];
+  }
+  std::partial_sum(_firstKeys.begin(), _firstKeys.end(), _firstKeys.begin());
+  countMemory();
 }
 
 // Whether every pair is compared by double, or as if it were. Two decimals are compared exactly,
@@ -383,26 +510,12 @@ void XQueryJoinTable::readTexts() {
   for (const Operand& key : _keys) _texts.push_back(key.text.view());
 }
 
-std::vector<NSStringView> XQueryJoinTable::textsOf(const Operands& probes) {
-  std::vector<NSStringView> texts;
-  for (const Operand& probe : probes) texts.push_back(probe.text.view());
-  return texts;
-}
-
-// NaN meets nothing.
-std::vector<double> XQueryJoinTable::numbersOf(const Operands& probes) {
-  std::vector<double> numbers;
-  for (Operand probe : probes) {
-    probe.scan();
-    if (!std::isnan(probe.number)) numbers.push_back(probe.number);
-  }
-  return numbers;
-}
-
 // A few probes are compared with every key; for more of them the keys are sorted.
 template <class Key, class Visit>
-void XQueryJoinTable::forEachOrdered(const std::vector<Key>& keys, const Key& probe, Order& order,
-                                     Asked asked, Visit visit) {
+void XQueryJoinTable::forEachOrdered(const std::vector<Key>& keys, const std::vector<Key>& probes,
+                                     Order& order, Asked asked, Visit visit) {
+  if (probes.empty()) return;
+  const Key& probe = probes.front();
   constexpr uint32_t few = 16;
   // So many are found in the order of the items as quickly as put into it.
   constexpr size_t part = 16;
@@ -455,23 +568,16 @@ std::span<const uint32_t> XQueryJoinTable::metInOrder(XQueryRelation relation,
   return fromLeast ? all.first(count) : all.subspan(count);
 }
 
-template <class Key, class HashOf, class Visit>
-void XQueryJoinTable::forEachMet(const std::vector<Key>& keys, std::vector<Key> probes,
-                                 Chains& chains, HashOf hashOf, Asked asked, Visit visit) {
+template <class Key, class Visit>
+void XQueryJoinTable::forEachEqual(const std::vector<Key>& keys, const std::vector<Key>& probes,
+                                   Buckets& buckets, bool areTies, Visit visit) {
   if (probes.empty()) return;
-  if (_relation.test != XQueryRelation::Equal) {
-    Order& order = std::is_same_v<Key, double> ? _numberOrder : _textOrder;
-    return forEachOrdered(keys, decidingProbe(_relation, probes), order, asked, visit);
-  }
-  if (!chains.isBuilt()) {
-    chains.build(keys.size(), [&](size_t key) { return hashOf(keys[key]); });
-  }
-  keepDistinct(probes);
+  if (!buckets.isBuilt()) buckets.build(keys);
   WorkPacer pacer;
   for (const Key& probe : probes) {
-    for (uint32_t key = chains.first(hashOf(probe)); key != Chains::end; key = chains.next(key)) {
+    for (const uint32_t key : buckets.at(hashOf(probe))) {
       pacer.turn();
-      if (isEqual(keys[key], probe) && !visit(key, asked.areTiesOpen)) return;
+      if (isEqual(keys[key], probe) && !visit(key, areTies)) return;
     }
   }
 }

@@ -20,6 +20,7 @@
 #include "Expr/XQuerySequence.h"
 #include "xquery/Object.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <functional>
@@ -59,20 +60,36 @@ class XQueryJoinTable final : public XQueryKeptValue {
   static constexpr size_t mostKeysPerItem = 32;
   static constexpr size_t keysOfAnyItems = size_t{1} << 18;
 
+  using Items = std::shared_ptr<const std::vector<Value>>;
   // The positions count the items, which the table keeps alive.
-  XQueryJoinTable(const XQueryJoinRelation& by, std::vector<Value> items, const KeyReader& keyOf);
+  XQueryJoinTable(const XQueryJoinRelation& by, Items items, const KeyReader& keyOf);
   ~XQueryJoinTable() override;
 
   // Whether it holds all keys. It does not when they are too many, or would take too much of the
   // memory that is left to the evaluation; such a table must not be asked.
   bool isComplete() const { return _isComplete; }
-  const std::vector<Value>& items() const { return _items; }
 
+  // A probe made ready to be asked about, good as long as the table and the tree of the probe.
+  class Question;
+
+  // Not for several threads at once: the table is completed by what it is asked.
+  //
+  // Nothing for a probe, null for one that could not be had, that has to be compared the plain way.
+  std::optional<Question> questionOf(const Value& probe);
+  // About how many items it will select.
+  size_t estimateFor(const Question& question);
   // Puts the items that meet the comparison with the probe, and those that have to be asked, into
-  // the list, in the order of the items, each once. False for a probe that has to be compared the
-  // plain way. Not for several threads at once: the table is completed by what it is asked. With
-  // `wantsFirst`, sure items behind the first one may be left out.
-  bool select(const Value& probe, Selection& selection, bool wantsFirst = false);
+  // the list, in the order of the items, each once. With `wantsFirst`, sure items behind the first
+  // one may be left out.
+  void select(const Question& question, Selection& selection, bool wantsFirst = false);
+  // Whether one item does; nothing where it has to be asked.
+  std::optional<bool> isMetBy(const Question& question, uint32_t position);
+  // Whether the item has always to be asked.
+  bool isIrregular(uint32_t position) const {
+    return std::binary_search(_irregular.begin(), _irregular.end(), position);
+  }
+  // Whether no other item has to be asked because of what it is compared with.
+  bool isRegularFor(const Question& question) const;
   // Whether any item meets the comparison with the probe; nothing when it has to be compared the
   // plain way.
   std::optional<bool> meets(const Value& probe);
@@ -95,20 +112,22 @@ class XQueryJoinTable final : public XQueryKeptValue {
   };
   using Operands = std::vector<Operand>;
 
-  // The keys of equal hash, in their order.
-  class Chains {
+  // The keys by their hash, those of one bucket in their order.
+  class Buckets {
    public:
-    template <class HashOf>
-    void build(size_t count, HashOf hashOf);
-    bool isBuilt() const { return !_heads.empty(); }
-    uint32_t first(uint32_t hash) const { return _heads[hash & (_heads.size() - 1)]; }
-    uint32_t next(uint32_t key) const { return _next[key]; }
-    size_t bytes() const { return (_heads.size() + _next.size()) * sizeof(uint32_t); }
-    static constexpr uint32_t end = UINT32_MAX;
+    template <class Key>
+    void build(const std::vector<Key>& keys);
+    bool isBuilt() const { return !_starts.empty(); }
+    // Keys of this hash, and others.
+    std::span<const uint32_t> at(uint32_t hash) const {
+      const size_t bucket = hash & (_starts.size() - 2);
+      return std::span(_keys).subspan(_starts[bucket], _starts[bucket + 1] - _starts[bucket]);
+    }
+    size_t bytes() const { return (_starts.size() + _keys.size()) * sizeof(uint32_t); }
 
    private:
-    std::vector<uint32_t> _heads;
-    std::vector<uint32_t> _next;
+    std::vector<uint32_t> _starts;  // a power of two, and one for the end
+    std::vector<uint32_t> _keys;
   };
 
   // Keys by their order, least first; without those that meet nothing.
@@ -120,12 +139,11 @@ class XQueryJoinTable final : public XQueryKeptValue {
   void readKeys(const KeyReader& keyOf);
   void read(uint32_t position, const Value& value);
   bool readNode(uint32_t position, const XQueryItemList& keys);
-  bool selectNode(const XQueryItemList& probes, Selection& selection);
   bool isTooLarge(int64_t bytesBefore) const;
   bool takes(const Operands& keys);
   // How the keys are compared with certain probes. Decimals that are equal as doubles need not be
   // equal, which leaves it open what they meet.
-  enum class Way : uint8_t { Plain, Nothing, Texts, Numbers, NumbersButTies };
+  enum class Way : uint8_t { Plain, Nothing, Nodes, Texts, Numbers, NumbersButTies };
   struct Asked {
     bool areTiesOpen;
     bool wantsFirst;
@@ -134,16 +152,24 @@ class XQueryJoinTable final : public XQueryKeptValue {
   Way wayOfNumbers(const Operands& probes) const;
   void scanTexts();
   void readTexts();
-  static std::vector<NSStringView> textsOf(const Operands& probes);
-  static std::vector<double> numbersOf(const Operands& probes);
+  void findKeysOfItems();
+  static bool isOfNumbers(const Question& question);
+  template <class Key>
+  size_t estimate(const std::vector<Key>& keys, const std::vector<Key>& probes, Buckets& buckets,
+                  Order& order);
+  template <class Key>
+  std::optional<bool> isMet(const std::vector<Key>& keys, const std::vector<Key>& probes,
+                            bool areTiesOpen, uint32_t position) const;
   // Calls visit(key, isTie) for each key that meets one of the probes, or is a tie with one, until
   // it answers false.
-  template <class Key, class HashOf, class Visit>
-  void forEachMet(const std::vector<Key>& keys, std::vector<Key> probes, Chains& chains,
-                  HashOf hashOf, Asked asked, Visit visit);
+  template <class Visit>
+  void forEachMet(const Question& question, bool wantsFirst, Visit visit);
   template <class Key, class Visit>
-  void forEachOrdered(const std::vector<Key>& keys, const Key& probe, Order& order, Asked asked,
-                      Visit visit);
+  void forEachEqual(const std::vector<Key>& keys, const std::vector<Key>& probes, Buckets& buckets,
+                    bool areTies, Visit visit);
+  template <class Key, class Visit>
+  void forEachOrdered(const std::vector<Key>& keys, const std::vector<Key>& probes, Order& order,
+                      Asked asked, Visit visit);
   template <class Key>
   static std::span<const uint32_t> metInOrder(XQueryRelation relation, const std::vector<Key>& keys,
                                               const Key& probe, Order& order);
@@ -162,20 +188,40 @@ class XQueryJoinTable final : public XQueryKeptValue {
   bool _hasInexactDecimals = false;
   bool _isScanned = false;
   int64_t _countedBytes = 0;
-  std::vector<Value> _items;
+  const Items _items;
   std::vector<Value> _keptKeys;  // the atomic keys, to which the texts refer
   Operands _keys;
   std::vector<uint32_t> _positions;  // of the item of each key
   std::vector<uint32_t> _irregular;  // positions of the items that have to be asked
   std::vector<uint32_t> _irregularAsNumbers;
-  std::vector<NSStringView> _texts;  // of each key
-  std::vector<double> _numbers;      // of each key; NaN for one that is none
-  std::vector<Value> _nodes;         // instead, where nodes are looked for
-  Chains _nodeChains;
-  Chains _textChains;
-  Chains _numberChains;
+  std::vector<NSStringView> _texts;     // of each key
+  std::vector<double> _numbers;         // of each key; NaN for one that is none
+  std::vector<const NSObject*> _nodes;  // instead, where nodes are looked for
+  std::vector<uint32_t> _firstKeys;     // of each item, in the list of the positions
+  Buckets _nodeBuckets;
+  Buckets _textBuckets;
+  Buckets _numberBuckets;
   Order _textOrder;
   Order _numberOrder;
 };
+
+class XQueryJoinTable::Question {
+  friend class XQueryJoinTable;
+  Way way = Way::Nothing;
+  Value probe;
+  Operands operands;  // hold what the texts are views of
+  // What decides: of an order one, otherwise each once, in order.
+  std::vector<NSStringView> texts;
+  std::vector<double> numbers;
+  std::vector<const NSObject*> nodes;
+};
+
+inline bool XQueryJoinTable::isOfNumbers(const Question& question) {
+  return question.way == Way::Numbers || question.way == Way::NumbersButTies;
+}
+
+inline bool XQueryJoinTable::isRegularFor(const Question& question) const {
+  return !isOfNumbers(question) || _irregularAsNumbers.empty();
+}
 
 }  // namespace xquery

@@ -69,12 +69,12 @@ std::shared_ptr<XQueryJoinTable> XQuerySetComparison::setOf(const Value& items, 
                              : keptValues.use(*this, dependencies, false, kept);
   if (use == XQueryKeptValues::Use::First) return nullptr;
   if (use == XQueryKeptValues::Use::Further) return std::static_pointer_cast<XQueryJoinTable>(kept);
-  std::vector<Value> listed;
+  const auto listed = std::make_shared<std::vector<Value>>();
   std::shared_ptr<XQueryJoinTable> made;
-  if (XQueryListItems(XQueryItemList(items.get()), listed) &&
-      listed.size() <= XQueryJoinTable::mostItems) {
+  if (XQueryListItems(XQueryItemList(items.get()), *listed) &&
+      listed->size() <= XQueryJoinTable::mostItems) {
     made = std::make_shared<XQueryJoinTable>(relationOf(_comparison.operatorType(), isLeft), listed,
-                                             [&listed](size_t index) { return listed[index]; });
+                                             [&listed](size_t index) { return (*listed)[index]; });
     if (!made->isComplete()) made = nullptr;
   }
   keptValues.keep(*this, dependencies, made);

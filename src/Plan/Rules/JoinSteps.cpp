@@ -24,20 +24,17 @@
 namespace xquery {
 namespace {
 
-// Of the predicates the one that joins best.
+// All predicates as one condition.
 XQueryJoinCondition conditionOf(const XQueryPlanning& planning,
                                 const std::vector<XQueryPlaceID>& places) {
-  XQueryJoinCondition best;
-  if (!XQueryPredicatesAreOfTruth(planning, places)) return best;
+  if (!XQueryPredicatesAreOfTruth(planning, places)) return {};
   XQueryJoinScope scope;
   scope.isFocus = true;
   const XQueryJoinSearch search(planning, scope, {});
-  for (const XQueryPlaceID place : places) {
-    XQueryJoinCondition found = search.conditionIn(place, true);
-    if (found.promise > best.promise) best = std::move(found);
-  }
-  best.isWhole = best.isWhole && places.size() == 1;
-  return best;
+  XQueryJoinCondition condition;
+  condition.isWhole = true;
+  for (const XQueryPlaceID place : places) condition.join(search.conditionIn(place, true));
+  return condition;
 }
 
 // Whether they depend on what the path starts with alone.
@@ -51,7 +48,7 @@ void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryWalkedPath& p
   if (planning.showsLeftovers(planning.facts[place].assigns, place)) return;
   if (const XQueryStep* start = path.start()) {
     auto condition = conditionOf(planning, XQueryPredicatesOf(planning, place, *start, 0));
-    if (condition.key) {
+    if (!condition.terms.empty()) {
       planning.choose(place);
       return path.setPicker(XQueryJoin::ofStep(path, std::move(condition), false), start);
     }
@@ -60,7 +57,7 @@ void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryWalkedPath& p
   for (size_t i = 0; i < steps.size(); ++i) {
     if (steps[i].isExpression() || steps[i].testMayRaise) return;
     auto condition = conditionOf(planning, XQueryPredicatesOf(planning, place, steps[i]));
-    if (!condition.key) continue;
+    if (condition.terms.empty()) continue;
     if (i + 1 < steps.size() && steps[i + 1].isExpression()) return;
     const XQueryFacts facts = XQueryFactsUpTo(planning, place, path, steps[i]);
     if (!isSettled(facts)) return;
