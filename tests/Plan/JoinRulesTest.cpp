@@ -186,6 +186,57 @@ TEST(ForJoins, RaiseTheErrorOfAKeyWhereItAlwaysComesUp) {
       "xs:integer($s/@v) = $p/@n return $s");
 }
 
+// Persons are found by the sales of an item although the clause of the sales comes later.
+TEST(ForJoins, LookAheadThroughALaterClause) {
+  EXPECT_EQ(joinsIn("for $i in //i, $p in //p, $s in //s "
+                    "where $i/@id = $s/@i and $p/@id = $s/b/@p return $s"),
+            2U);
+  EXPECT_EQ(joinsIn("for $i in //i, $p in //p, $s in //s where $i/@id = $s/@i return $s"), 1U);
+  for (const char* text : {
+           "for $i in //i, $p in //p, $s in //s "
+           "where $p/@id = $s/b/@p and $i/@c = $p/@c and $i/@id = $s/@i return ($i, $p, $s)",
+           "for $i in (//i, //s/@i), $p in //p, $s in (//s, <s i='i3'><b p='p3'/></s>) "
+           "where $i/@id = $s/@i and $p/@id = $s/b/@p return ($i, $p, $s/@i)",
+           "for $i in (1, //i), $p at $n in //p, $s in //s "
+           "where $i = $s/@i and $p/@id = $s/b/@p return ($n, $s)",
+           "for $i in //i, $p in //p, $s in //s[xs:integer(@v) > 0] "
+           "where $i/@id = $s/@i and $p/@id = $s/b/@p return ($i, $p, $s)",
+           "for $i in //i, $p in //p, $s in (//s, 1) "
+           "where $i/@id = $s/@i and $p/@id = $s/b/@p return ($i, $p, $s)",
+       }) {
+    resultOf(text);
+  }
+}
+
+// "if" in the return clause asks as "where" does.
+TEST(ForJoins, TakeTheConditionOfTheReturnClause) {
+  for (const char* text : {
+           "for $p in //p return count(for $s in //s return if ($s/b/@p = $p/@id) then $s else ())",
+           "for $p in //p, $s in //s return if ($s/b/@p = $p/@id) then ($p/@id, $s/@i) else ()",
+           "for $p in //p return sum(for $s in //s return if ($s/b/@p = $p/@id) then 1 else 0)",
+           "for $i in 1 to 20 return sum((for $s in //s[@v != 'x'] return "
+           "(if ($s/@v < $i) then $s/@v else 0)))",
+           "for $p in //p return //i/sum(for $s in //s return if ($s/@i = $p/@id) then 1 else 0)",
+           "for $p in //p return sum(for $s in //s return if ($s/@v < $p/@n) then -0e0 else 0)",
+       }) {
+    EXPECT_EQ(joinsIn(text), 1U) << text;
+    resultOf(text);
+  }
+  for (const char* text : {
+           "for $p in //p return sum(for $s in //s return if ($s/b/@p = $p/@id) then 1 else 2)",
+           "for $p in //p return avg(for $s in //s return if ($s/b/@p = $p/@id) then 1 else 0)",
+           "for $p in //p return sum(for $s in //s return if ($s/@i = $p/@id) then 1 else 0, 7)",
+           "for $p in //p return sum(for $s in //s return if ($s/@i = $p/@id) then 'a' else 0)",
+           "for $p in //p return sum(for $s in //s, $b in $s/b return "
+           "if ($b/@p = $p/@id) then 1 else 0)",
+           "for $p in //p return for $s in //s return if ($s/b/@p = $p/@id) then $s else trace(1, "
+           "'')",
+       }) {
+    EXPECT_EQ(joinsIn(text), 0U) << text;
+    resultOf(text);
+  }
+}
+
 // --- quantifiers ---------------------------------------------------------------------------------
 
 TEST(QuantifierJoins, FindWhatSomeAsksFor) {

@@ -4,6 +4,7 @@
 #include "Expr/RandomChoices.h"
 
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace xquery::plantest {
@@ -419,6 +420,8 @@ class ProgramGenerator {
                     }) +
              ")" + (_random.below(4) ? "" : ", " + std::string("$u"));
     }
+    if (_random.below(5) == 0) return conditional(depth);
+    if (_random.below(5) == 0) return chain();
     std::string text = "for $u in " + many() + " ";
     return "(" + text +
            within("$u",
@@ -432,6 +435,38 @@ class ProgramGenerator {
                            });
                   }) +
            ")";
+  }
+
+  // The condition of a join in the return clause.
+  std::string conditional(int depth) {
+    const bool isSum = _random.below(2) == 0;
+    const std::string clause = "for $u in " + many() + " ";
+    return within("$u", [&] {
+      const std::string condition = "return if (" + matches("$u") + ") then ";
+      const std::string value = _random.oneOf({"1", "$u", "2.5", "$u/@x", "-0e0", "'u'"});
+      return isSum ? "(sum(" + clause + condition + value + " else 0))"
+                   : "(" + clause + condition + expr(depth - 1) + " else ())";
+    });
+  }
+
+  // Clauses that are joined through another one.
+  std::string chain() {
+    const auto few = [&] { return "(" + many() + ")[position() < 10]"; };
+    const auto key = [&](const std::string& item) {
+      return item + _random.oneOf({"/@x", "/@x", "/@y", "/@*", "/..", ""});
+    };
+    const auto equality = [&](const std::string& one, const std::string& other) {
+      return _random.below(2) ? key(one) + " = " + key(other) : key(other) + " = " + key(one);
+    };
+    std::vector<std::string> conditions = {equality("$u", "$z"), equality(variable(), "$z")};
+    if (_random.below(2)) conditions.push_back(equality("$u", "$z"));
+    if (_random.below(2)) conditions.push_back(equality("$u", variable()));
+    std::string text = "(for $u in " + few() + ", $z in " + few() + " where ";
+    for (size_t left = conditions.size(); left > 0; --left) {
+      std::swap(conditions[_random.below(left)], conditions[left - 1]);
+      text += conditions[left - 1] + (left > 1 ? " and " : "");
+    }
+    return text + " return " + _random.oneOf({"$u", "$z", "<b>{$u, $z}</b>"}) + ")";
   }
 
   std::string negatedFor(const std::string& kind, const std::string& condition) {

@@ -13,6 +13,8 @@
 #include "xquery/Collection.h"
 #include "xquery/Number.h"
 
+#include <algorithm>
+
 namespace xquery {
 
 // What the tuples have yielded: values, or items with their keys when there are order specs.
@@ -177,13 +179,19 @@ bool XQueryFLWORExpr::evaluatePicks(const XQueryForExpr& clause, size_t index,
                                     XQueryContext& withContext) const {
   const bool isLast = index + 1 == _forLet.size();
   const auto& items = *picks.items;
+  const XQueryExpr* sureReturn = _sureReturn ? _sureReturn.get() : _returnExpr.get();
   for (const XQueryPick& pick : picks.chosen) {
     checkWork();
     setTuple(clause, items[pick.position], pick.position, withContext);
     const bool goesOn = !isLast       ? evaluateStartingAt(index + 1, toResults, withContext)
-                        : pick.isSure ? addTuple(toResults, withContext)
+                        : pick.isSure ? addTuple(sureReturn, toResults, withContext)
                                       : processItem(toResults, withContext);
     if (!goesOn) return false;
+  }
+  constexpr size_t two = 2;
+  const size_t others = _otherReturn ? std::min(two, items.size() - picks.chosen.size()) : 0;
+  for (size_t k = 0; k < others; ++k) {
+    if (!addTuple(_otherReturn.get(), toResults, withContext)) return false;
   }
   // Where the ID is used again by a variable that is never set, the last item can be read.
   setTuple(clause, items.back(), items.size() - 1, withContext);
@@ -197,11 +205,12 @@ bool XQueryFLWORExpr::processItem(XQueryFLWORResults& toResults, XQueryContext& 
     // Only false drops the tuple: an error record lets it through.
     if (XQueryEffectiveBooleanValue(where, withContext) == NSNumber::falseValue()) return true;
   }
-  return addTuple(toResults, withContext);
+  return addTuple(_returnExpr.get(), toResults, withContext);
 }
 
-bool XQueryFLWORExpr::addTuple(XQueryFLWORResults& toResults, XQueryContext& withContext) const {
-  Value value = XQueryEvaluateOrEmpty(_returnExpr.get(), withContext);
+bool XQueryFLWORExpr::addTuple(const XQueryExpr* returned, XQueryFLWORResults& toResults,
+                               XQueryContext& withContext) const {
+  Value value = XQueryEvaluateOrEmpty(returned, withContext);
   if (XQueryHasFailed(value, withContext)) return false;
   if (!_orderSpecs.empty()) {
     return addSortItems(std::move(value), toResults.sortList, withContext);

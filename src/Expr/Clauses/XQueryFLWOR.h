@@ -109,6 +109,13 @@ class XQueryFLWORExpr : public XQueryExpr {
   // Null without one.
   const XQueryExpr* whereExpr() const { return _whereExpr.get(); }
   const OrderSpecs& orderSpecs() const { return _orderSpecs; }
+  // Where the return clause asks the condition by which items are picked: what it answers for those
+  // for which the condition holds, and for those for which it does not, of which two count for any
+  // number. Null: the return clause, and nothing.
+  void setReturnOfPicks(Ref<XQueryExpr> ofSure, Ref<XQueryExpr> ofOthers) {
+    _sureReturn = std::move(ofSure);
+    _otherReturn = std::move(ofOthers);
+  }
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
   void visitParts(XQueryPartVisitor& visitor) override;
@@ -126,7 +133,8 @@ class XQueryFLWORExpr : public XQueryExpr {
   bool evaluateFor(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
                    XQueryContext& withContext) const;
   bool processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
-  bool addTuple(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
+  bool addTuple(const XQueryExpr* returned, XQueryFLWORResults& toResults,
+                XQueryContext& withContext) const;
   bool addSortItems(Value value, XQuerySortList& toList, XQueryContext& context) const;
   bool isOfType(const XQueryBindingExpr& clause, const NSObject* value,
                 XQueryContext& context) const;
@@ -140,6 +148,8 @@ class XQueryFLWORExpr : public XQueryExpr {
   Ref<XQueryExpr> _whereExpr;
   OrderSpecs _orderSpecs;
   Ref<XQueryExpr> _returnExpr;
+  Ref<XQueryExpr> _sureReturn;
+  Ref<XQueryExpr> _otherReturn;
 };
 
 // "ordered {...}" and "unordered {...}": the ordering mode for the extent of the operand.

@@ -4,8 +4,10 @@
 #include "Expr/Clauses/XQueryQuantified.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Plan/Joins/XQueryJoin.h"
+#include "Plan/Joins/XQueryProbesAhead.h"
 
 #include <memory>
+#include <optional>
 #include <utility>
 
 namespace xquery {
@@ -75,8 +77,96 @@ XQueryClauseJoins::Later XQueryClauseJoins::clausesBehind(size_t index,
   return found;
 }
 
-void XQueryClauseJoins::joinClause(size_t index) {
-  if (!walksItems(index)) return;
+XQueryClauseJoins::Sides XQueryClauseJoins::sidesOf(XQueryPlaceID comparison) const {
+  const auto* operation = dyn_cast<XQueryOperatorExpr>(at(comparison).expr);
+  if (!operation || operation->operatorType() != XQueryOperatorEqual) return {};
+  if (XQueryOperatorExpr::rangeIn(operation->right())) return {};
+  const XQueryPlaceID first = _planning.program.firstPart(comparison);
+  const XQueryPlaceID second =
+      first == XQueryNoPlace ? XQueryNoPlace : _planning.program.nextPart(first);
+  return second == XQueryNoPlace ? Sides() : Sides{first, second};
+}
+
+bool XQueryClauseJoins::readsOnly(XQueryPlaceID place, int64_t varID) const {
+  using namespace XQueryDeeds;
+  XQueryVariableSet own;
+  own.add(varID);
+  const XQueryFacts& known = facts(place);
+  return known.isRepeatable() && !known.does(ReadsFocus | ReadsGlobals) && !known.reads.isEmpty() &&
+         known.reads.isExact() && own.holds(known.reads);
+}
+
+// Items that a later clause has nothing for need not be walked. Of "$i/@id = $s/item and $p/@id =
+// $s/buyer" the first one picks sales before $p is walked, and these pick persons. None of the
+// conditions up to there may fail, so that it cannot be told which was asked first.
+void XQueryClauseJoins::addTermsAhead(size_t index, const XQueryJoinScope& scope,
+                                      const XQueryJoinSearch& search,
+                                      XQueryJoinCondition& condition) const {
+  std::vector<XQueryPlaceID> conditions;
+  for (const XQueryPlaceID each : search.conjuncts(_condition)) {
+    if (!search.cannotFail(each) || !facts(each).isRepeatable()) break;
+    conditions.push_back(each);
+  }
+  for (size_t later = index + 1; later < _clauses.size() && conditions.size() > 1; ++later) {
+    if (!walksItems(later) || clauseAt(later).kind() != Kind::ForExpr) continue;
+    if (scope.readsOf(facts(boundAt(later))) != XQueryJoinReads::Round) continue;
+    addTermsAhead(later, conditions, clauseAt(index).varID(), scope, condition);
+  }
+}
+
+// Those of one later clause, for the items of the variable.
+void XQueryClauseJoins::addTermsAhead(size_t later, const std::vector<XQueryPlaceID>& conditions,
+                                      int64_t varID, const XQueryJoinScope& scope,
+                                      XQueryJoinCondition& condition) const {
+  constexpr int promise = 3;
+  const int64_t laterID = clauseAt(later).varID();
+  const auto looksOut = [&](XQueryPlaceID place) {
+    return facts(place).does(XQueryDeeds::ReadsOutside);
+  };
+  XQueryJoinCondition ofLater;
+  XQueryFacts outward;
+  outward.addDeeds(facts(boundAt(later)));
+  for (const XQueryPlaceID each : conditions) {
+    Sides sides = sidesOf(each);
+    if (sides.first == XQueryNoPlace) continue;
+    if (readsOnly(sides.second, laterID)) std::swap(sides.first, sides.second);
+    const XQueryFacts& probe = facts(sides.second);
+    const bool picks = readsOnly(sides.first, laterID) && !probe.reads.isEmpty() &&
+                       scope.readsOf(probe) == XQueryJoinReads::Round;
+    if (!picks) continue;
+    outward.addDeeds(probe);
+    ofLater.terms.push_back({_planning.exprAt(sides.first),
+                             _planning.exprAt(sides.second),
+                             {},
+                             promise,
+                             false,
+                             false,
+                             looksOut(sides.first),
+                             std::nullopt});
+  }
+  if (ofLater.terms.empty()) return;
+  ofLater.isWhole = true;
+  for (const XQueryPlaceID each : conditions) {
+    Sides sides = sidesOf(each);
+    if (sides.first == XQueryNoPlace) continue;
+    if (readsOnly(sides.second, varID)) std::swap(sides.first, sides.second);
+    if (!readsOnly(sides.first, varID) || !readsOnly(sides.second, laterID)) continue;
+    auto probe = XQueryProbesAhead::exprWithProbe(_planning.exprAt(sides.second), laterID,
+                                                  _planning.exprAt(boundAt(later)));
+    probe->setPicker(XQueryJoin::ofClause(*probe, laterID, ofLater));
+    XQueryJoinTerm term{_planning.exprAt(sides.first), probe,       {}, promise, false, false,
+                        looksOut(sides.first),         std::nullopt};
+    outward.addDeeds(facts(sides.second));
+    outward.reads.remove(laterID);
+    if (outward.does(XQueryDeeds::ReadsOutside)) term.outward = outward;
+    condition.terms.push_back(std::move(term));
+    condition.assigns.add(facts(_condition).assigns);
+    return condition.putBestFirst();
+  }
+}
+
+bool XQueryClauseJoins::joinClause(size_t index) {
+  if (!walksItems(index)) return false;
   const XQueryBindingExpr& clause = clauseAt(index);
   XQueryJoinScope scope;
   scope.item.add(clause.varID());
@@ -87,17 +177,22 @@ void XQueryClauseJoins::joinClause(size_t index) {
   XQueryJoinCondition condition = _picks == Picks::WhereItHolds
                                       ? search.conditionIn(_condition, false)
                                       : search.complementIn(_condition);
-  if (condition.terms.empty()) return;
+  if (_picks == Picks::WhereItHolds) addTermsAhead(index, scope, search, condition);
+  if (condition.terms.empty()) return false;
   later.leftovers.add(condition.assigns);
   if (later.obstacle.empty() && _planning.showsLeftovers(later.leftovers, _condition)) {
     later.obstacle = "a variable that would be left with another item may be read unset";
   }
-  if (!later.obstacle.empty()) return _planning.refuse(_clauses[index], later.obstacle);
+  if (!later.obstacle.empty()) {
+    _planning.refuse(_clauses[index], later.obstacle);
+    return false;
+  }
   condition.isWhole = condition.isWhole && index + 1 == _clauses.size();
   condition.needed.insert(condition.needed.end(), later.needed.begin(), later.needed.end());
   _planning.choose(_clauses[index]);
   auto* joined = cast<XQueryBindingExpr>(at(_clauses[index]).expr);
   joined->setPicker(XQueryJoin::ofClause(clause, clause.varID(), std::move(condition)));
+  return true;
 }
 
 }  // namespace xquery

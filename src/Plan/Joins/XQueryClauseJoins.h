@@ -18,16 +18,19 @@ class XQueryClauseJoins {
   // which it may hold, or for which it may not hold.
   enum class Picks : uint8_t { WhereItHolds, WhereItFails };
 
-  // The condition, a part of the expression, stands behind the clauses.
-  XQueryClauseJoins(XQueryPlanning& planning, XQueryPlaceID expr, XQueryPlaceID condition,
-                    Picks picks)
+  // The condition stands in a part of the expression, or is one, behind the clauses.
+  XQueryClauseJoins(XQueryPlanning& planning, XQueryPlaceID expr, XQueryPlaceID part,
+                    XQueryPlaceID condition, Picks picks)
       : _planning(planning),
-        _clauses(partsBefore(condition, expr, planning.program)),
+        _clauses(partsBefore(part, expr, planning.program)),
         _condition(condition),
         _picks(picks) {}
 
-  void join() {
-    for (size_t index = 0; index < _clauses.size(); ++index) joinClause(index);
+  // Whether any clause has been given a join.
+  bool join() {
+    bool areAny = false;
+    for (size_t index = 0; index < _clauses.size(); ++index) areAny = joinClause(index) || areAny;
+    return areAny;
   }
 
  private:
@@ -58,9 +61,20 @@ class XQueryClauseJoins {
   };
 
   Later clausesBehind(size_t index, XQueryJoinScope& scope) const;
+  // The operands of an equality.
+  struct Sides {
+    XQueryPlaceID first = XQueryNoPlace;
+    XQueryPlaceID second = XQueryNoPlace;
+  };
+  Sides sidesOf(XQueryPlaceID comparison) const;
+  bool readsOnly(XQueryPlaceID place, int64_t varID) const;
+  void addTermsAhead(size_t index, const XQueryJoinScope& scope, const XQueryJoinSearch& search,
+                     XQueryJoinCondition& condition) const;
+  void addTermsAhead(size_t later, const std::vector<XQueryPlaceID>& conditions, int64_t varID,
+                     const XQueryJoinScope& scope, XQueryJoinCondition& condition) const;
   bool walksItems(size_t index) const;
   bool mayFollow(size_t index, size_t later) const;
-  void joinClause(size_t index);
+  bool joinClause(size_t index);
 
   XQueryPlanning& _planning;
   const std::vector<XQueryPlaceID> _clauses;

@@ -87,7 +87,6 @@ struct XQueryJoinSearch::Comparison {
   bool isWhole = true;
 };
 
-// The conditions that "and" joins, in their order; none for too long a chain.
 std::vector<XQueryPlaceID> XQueryJoinSearch::conjuncts(XQueryPlaceID condition) const {
   std::vector<XQueryPlaceID> found;
   std::vector<XQueryPlaceID> waiting = {condition};
@@ -299,7 +298,6 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonAt(XQueryPlaceID place)
   return operandsAt(place, _scope);
 }
 
-// Nothing that it could come to makes "and" fail.
 bool XQueryJoinSearch::cannotFail(XQueryPlaceID place) const {
   return !facts(place).does(XQueryDeeds::MayFail) &&
          (facts(place).are(XQueryItems::Boolean) || facts(place).are(XQueryItems::Node));

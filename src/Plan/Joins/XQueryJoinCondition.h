@@ -88,12 +88,16 @@ class XQueryJoinSearch {
   // The same where the items are picked for which the condition may not hold.
   XQueryJoinCondition complementIn(XQueryPlaceID place) const;
 
+  // The conditions that "and" joins, in their order; none for too long a chain.
+  std::vector<XQueryPlaceID> conjuncts(XQueryPlaceID condition) const;
+  // Nothing that the condition could come to makes "and" fail.
+  bool cannotFail(XQueryPlaceID place) const;
+
  private:
   struct Comparison;
 
   const XQueryPlace& at(XQueryPlaceID place) const { return _planning.program[place]; }
   const XQueryFacts& facts(XQueryPlaceID place) const { return _planning.facts[place]; }
-  std::vector<XQueryPlaceID> conjuncts(XQueryPlaceID condition) const;
   Comparison comparisonAt(XQueryPlaceID place) const;
   struct Operand {
     Ref<XQueryExpr> expr;
@@ -107,7 +111,6 @@ class XQueryJoinSearch {
   bool describePartOfCall(XQueryPlaceID call, XQueryPlaceID body, XQueryPlaceID part,
                           Operand& operand) const;
   Comparison comparisonOfSome(XQueryPlaceID place) const;
-  bool cannotFail(XQueryPlaceID place) const;
   struct Before;
   XQueryJoinScope ofItemOnly() const;
   XQueryJoinCondition termsIn(XQueryPlaceID place, bool errorExcludes, bool takesConstants) const;

@@ -26,7 +26,7 @@ void XQueryJoinQuantifiers(XQueryPlanning& planning) {
     if (satisfies == XQueryNoPlace) continue;
     using Picks = XQueryClauseJoins::Picks;
     const Picks picks = quantifier->every() ? Picks::WhereItFails : Picks::WhereItHolds;
-    XQueryClauseJoins(planning, place, satisfies, picks).join();
+    XQueryClauseJoins(planning, place, satisfies, satisfies, picks).join();
   }
 }
 
