@@ -83,7 +83,7 @@ class ProgramGenerator {
   }
 
   std::string nodeTest() {
-    return _random.oneOf({"a", "b", "c", "*", "a", "b", "text()", "node()"});
+    return _random.oneOf({"a", "b", "c", "*", "a", "b", "text()", "node()", "*:a"});
   }
 
   std::string predicate(int depth) {
@@ -112,7 +112,9 @@ class ProgramGenerator {
                                   _random.oneOf({"'a'", "'b'", "'x'", "'p:a'", "('a', 'c')"});
     switch (_random.below(4)) {
       case 0:
-        return _random.oneOf({"self::a", "self::a or self::b", "self::x or self::y"});
+        return _random.oneOf({"self::a", "self::a or self::b", "self::x or self::y",
+                              ". instance of element(a)", "string(node-name(.)) = 'b'",
+                              "local-name() = 'a' and string(namespace-uri(.)) = 'urn:p'"});
       case 1:
         return _random.oneOf({"self::b or ", "self::c or self::x or "}) + condition;
       default:

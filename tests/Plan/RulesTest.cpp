@@ -122,10 +122,27 @@ const Value& manyNames() {
 
 TEST(TakeNames, TakesOverFiltersAndUnions) {
   for (const char* path :
-       {"//*[self::a]", "//*[self::a or self::b]", "//*[name() = 'a']", "//*['a' eq local-name(.)]",
-        "//node()[name() = ('a', 'b')]", "//element()[self::a or name(.) = 'c'][2]", "//(a | b)",
-        "/r/(a | (b | c))", "//a/(@x | @y)[1]", "//(a | b)[@x]/..", "//*[(self::a) or (self::b)]",
-        "/r/*/*[name() = 'b']/@z", "//a | //b", "(/r/a | /r/b) | /r/c"}) {
+       {"//*[self::a]",
+        "//*[self::a or self::b]",
+        "//*[name() = 'a']",
+        "//*['a' eq local-name(.)]",
+        "//node()[name() = ('a', 'b')]",
+        "//element()[self::a or name(.) = 'c'][2]",
+        "//(a | b)",
+        "/r/(a | (b | c))",
+        "//a/(@x | @y)[1]",
+        "//(a | b)[@x]/..",
+        "//*[(self::a) or (self::b)]",
+        "//*[self::a and self::b]",
+        "//*:a",
+        "//@*:x",
+        "//node()[. instance of element(a)]",
+        "//*[string(node-name(.)) = 'a']",
+        "//*[local-name() = 'a' and string(namespace-uri()) = 'u']",
+        "//*[self::a or (string(namespace-uri(.)) = ('u', 'v') and name() = ('a', 'p:a'))]",
+        "/r/*/*[name() = 'b']/@z",
+        "//a | //b",
+        "(/r/a | /r/b) | /r/c"}) {
     EXPECT_EQ(choicesIn(path), 1U) << path;
     for (const Value& tree : {names(), manyNames()}) {
       resultOf(path, tree);
@@ -137,7 +154,15 @@ TEST(TakeNames, TakesOverFiltersAndUnions) {
 TEST(TakeNames, LeavesOthersAlone) {
   for (const char* path : {"//*[name() != 'a']",
                            "//*[name() = '']",
-                           "//*[self::a and self::b]",
+                           "//*[self::a and @x]",
+                           "//*[namespace-uri() = 'u']",
+                           "//*[string(namespace-uri()) = '']",
+                           "//*[string(node-name()) = 'a']",
+                           "//*[. instance of element()]",
+                           "//*[. instance of element(a)*][2]/last()",
+                           "//*[b instance of element(b)]",
+                           "//a[. instance of element(a)]",
+                           "//p:*",
                            "//a[self::a]",
                            "//*[self::p:a]",
                            "//*[self::*]",
@@ -173,7 +198,10 @@ TEST(TakeNames, FindsWhatTheConditionFinds) {
     for (const char* test : {"*", "node()", "element()"}) {
       for (const char* condition :
            {"self::a", "name() = 'a'", "name() = 'p:a'", "local-name() = 'a'", "name() = ':a'",
-            "name() = ('p:a', 'b')", "self::a or local-name() = 'b'", "name() = 'x'"}) {
+            "name() = ('p:a', 'b')", "self::a or local-name() = 'b'", "name() = 'x'",
+            ". instance of element(a)", ". instance of element(b)+", "string(node-name(.)) = 'a'",
+            "'u' = string(namespace-uri())", "self::a and string(namespace-uri(.)) = 'u'",
+            "local-name(.) = 'a' and string(namespace-uri(.)) = 'u' or self::b"}) {
         const std::string filter = std::string(test) + "[" + condition + "]";
         resultOf("(//" + filter + ", count(//" + filter + "))", tree);
         resultOf("/r/a[1]//" + filter + "[2]", tree);
@@ -186,6 +214,17 @@ TEST(TakeNames, FindsWhatTheConditionFinds) {
   }
 }
 
+TEST(TakeNames, FindsWhatAWildcardFinds) {
+  for (const Value& tree : {names(), manyNames()}) {
+    for (const char* step : {"*:a", "*:b", "q:*", "@*:x", "@q:*", "descendant::*:c", "*:a[2]",
+                             "q:*[last()]", "*:a[@x]/..", "preceding::*:b", "*:a/position()"}) {
+      const std::string prolog = "declare namespace q = 'u'; ";
+      resultOf(prolog + "(//" + step + ", count(//" + step + "))", tree);
+      resultOf(prolog + "for $i in //* return name(($i/" + step + ")[1])", tree);
+    }
+  }
+}
+
 // The context may have a default namespace, of which names without a prefix then are.
 TEST(TakeNames, ResolvesNamesInTheContext) {
   constexpr const char* prolog = "declare default element namespace 'v'; ";
@@ -194,6 +233,9 @@ TEST(TakeNames, ResolvesNamesInTheContext) {
   EXPECT_EQ(resultOf("<e xmlns='v'>{count(//(a | d))}</e>", names()).size(), 2U);
   resultOf("declare namespace q = 'u'; //(q:a | b)", names());
   resultOf("//*[self::p:a]", names());
+  EXPECT_EQ(resultOf(std::string(prolog) + "count(//*[. instance of element(d)])", names()).front(),
+            "xs:integer 1");
+  resultOf("<e xmlns='v'>{count(//*[. instance of element(d)])}</e>", names());
 }
 
 // --- counts --------------------------------------------------------------------------------------

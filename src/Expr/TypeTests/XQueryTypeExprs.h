@@ -19,6 +19,8 @@ class XQueryTypedExpr : public XQueryExpr {
   void bindInfoForProlog(XQueryProlog& prolog) override;
   void visitParts(XQueryPartVisitor& visitor) override;
   const XQueryTypeDeclaration& type() const { return *_type; }
+  // May be null.
+  const XQueryExpr* subject() const { return _expr.get(); }
 
  protected:
   // A null operand is the empty sequence.

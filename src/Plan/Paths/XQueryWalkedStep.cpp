@@ -6,6 +6,7 @@ namespace xquery {
 XQueryStepTest::XQueryStepTest(const XQueryWalkedStep& step, XQueryPathRun& run)
     : _test(step.test, run), _choice(step.choice.get()) {
   if (!_choice) return;
+  if (_choice->isOfElements()) _test.restrictTo(XQueryKindBit(Kind::Element));
   if (const XQueryNameTest* only = _choice->onlyTest()) {
     const uint32_t kinds = _test.kinds();
     _test = XQueryNodeTest(only, run);

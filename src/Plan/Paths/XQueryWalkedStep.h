@@ -44,7 +44,7 @@ struct XQueryWalkedStep {
     choice = std::make_unique<const XQueryNameChoice>(std::move(names));
     predicatesInTest = ofPredicates;
   }
-  // Puts a step with such names in the place of the expression.
+  // Puts a step with such names in the place of what is written.
   void becomeAxisStep(int onAxis, XQueryNameChoice names) {
     axis = onAxis;
     ownTest = XQueryWildCardNameTest::nameTest(nullptr, nullptr);

@@ -19,9 +19,10 @@ void XQueryCompareNames(XQueryPlanning& planning) {
     if (!planning.isOpen(place)) continue;
     const auto condition = XQueryNameConditionIn(*planning.program[place].expr);
     if (!condition || condition->texts.size() != 1) continue;
-    const auto which = condition->by == XQueryNameChoice::By::Name
-                           ? XQueryNameComparison::Name::Qualified
-                           : XQueryNameComparison::Name::Local;
+    using By = XQueryNameChoice::By;
+    if (condition->by != By::Name && condition->by != By::LocalName) continue;
+    const auto which = condition->by == By::Name ? XQueryNameComparison::Name::Qualified
+                                                 : XQueryNameComparison::Name::Local;
     planning.wrap(place, XQueryNameComparison::exprWithPlain(*planning.program[place].slot, which,
                                                              condition->texts.front()));
   }

@@ -12,17 +12,33 @@ namespace {
 
 using By = XQueryNameChoice::By;
 
-// Which name of the context item the expression asks for, if any.
-std::optional<By> nameAskedFor(const XQueryExpr* expr) {
+struct AskedName {
+  By by;
+  bool isString;  // what asks for it answers a string
+};
+
+// The only argument of a call of that function; null for anything else.
+const XQueryExpr* argumentOf(const XQueryExpr* expr, XQueryProcedure function) {
   const auto* call = dyn_cast<XQueryFunctionCall>(expr);
+  const bool fits = call && call->builtIn() && call->function() == function && call->args() &&
+                    call->args()->count() == 1;
+  return fits ? XQueryWithoutParentheses(call->args()->objectAtIndex(0)) : nullptr;
+}
+
+// Which name of the context item the expression asks for, if any. The string of what is no name is
+// the empty one.
+std::optional<AskedName> nameAskedFor(const XQueryExpr* expr) {
+  const XQueryExpr* argument = argumentOf(expr, fn_string);
+  const auto* call = dyn_cast<XQueryFunctionCall>(argument ? argument : expr);
   if (!call || !call->builtIn()) return std::nullopt;
-  const size_t count = call->args() ? call->args()->count() : 0;
-  const bool isOfItem =
-      count == 0 || (count == 1 && isa<XQueryContextItem>(
-                                       XQueryWithoutParentheses(call->args()->objectAtIndex(0))));
-  if (!isOfItem) return std::nullopt;
-  if (call->function() == fn_name) return By::Name;
-  if (call->function() == fn_local_name) return By::LocalName;
+  const XQueryExpr* item = argumentOf(call, call->function());
+  const bool hasItem = item && isa<XQueryContextItem>(item);
+  const bool isOfItem = hasItem || !call->args() || call->args()->count() == 0;
+  if (isOfItem && call->function() == fn_name) return AskedName{By::Name, true};
+  if (isOfItem && call->function() == fn_local_name) return AskedName{By::LocalName, true};
+  const bool isString = argument != nullptr;
+  if (isOfItem && call->function() == fn_namespace_uri) return AskedName{By::URI, isString};
+  if (hasItem && call->function() == fn_node_name) return AskedName{By::NodeName, isString};
   return std::nullopt;
 }
 
@@ -62,9 +78,10 @@ std::optional<XQueryNameCondition> XQueryNameConditionIn(const XQueryExpr& expr)
     by = nameAskedFor(right);
     texts = stringsIn(left);
   }
-  const bool isKnown = by && !texts.empty() && (texts.size() == 1 || type == XQueryOperatorEqual);
+  const bool isKnown =
+      by && by->isString && !texts.empty() && (texts.size() == 1 || type == XQueryOperatorEqual);
   if (!isKnown) return std::nullopt;
-  return XQueryNameCondition{*by, std::move(texts)};
+  return XQueryNameCondition{by->by, std::move(texts)};
 }
 
 }  // namespace xquery

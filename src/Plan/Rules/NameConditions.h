@@ -12,7 +12,7 @@ namespace xquery {
 class XQueryExpr;
 
 struct XQueryNameCondition {
-  XQueryNameChoice::By by;
+  XQueryNameChoice::By by;           // a text
   std::vector<Ref<NSString>> texts;  // one at least; the name is one of them
 };
 

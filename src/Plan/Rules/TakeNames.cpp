@@ -1,7 +1,9 @@
 // Names that a step could have asked for itself.
 //
-// Pattern     *[self::a], *[self::a or self::b], *[name() = "a"], *[local-name(.) = ("a", "b")]
-//             where that is the first predicate of the step; P/(a | b), P//(a | b), P/(@a | @b);
+// Pattern     *[self::a], *[self::a or self::b], *[name() = "a"], *[local-name(.) = ("a", "b")],
+//             *[string(node-name(.)) = "a"], *[string(namespace-uri()) = "u" and ...],
+//             node()[. instance of element(a)] where that is the first predicate of the step; *:a,
+//             p:*; P/(a | b), P//(a | b), P/(@a | @b);
 //             //a | //b, /r/a | /r/b
 // Facts       the test before the filter looks at kinds of nodes alone; the names can be resolved
 //             without an error; no expression behind it asks for the position that a node has
@@ -13,6 +15,8 @@
 //             the one and those that have the other; so are the results of whole paths from the
 //             document, where they are sorted
 #include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/TypeTests/XQueryTypeExprs.h"
+#include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Plan/Paths/XQueryWalkedPath.h"
 #include "Plan/Planning.h"
@@ -41,6 +45,8 @@ Ref<XQueryNameTest> testOf(const XQueryAxisStep& step) {
 
 constexpr size_t mostNames = 64;
 
+using By = XQueryNameChoice::By;
+
 // Takes apart what one operator joins, in any number, from left to right.
 template <class IsJoint, class Visit>
 bool forEachOperand(const XQueryExpr* expr, IsJoint isJoint, Visit visit) {
@@ -65,26 +71,75 @@ bool isOperator(const XQueryExpr& expr, int type) {
   return found && found->operatorType() == type;
 }
 
+// The test of ". instance of element(a)"; null for anything else.
+Ref<XQueryNameTest> elementAskedFor(const XQueryExpr& condition) {
+  const auto* expr = dyn_cast<XQueryInstanceOfExpr>(&condition);
+  const auto* item = expr ? XQueryWithoutParentheses(expr->subject()) : nullptr;
+  if (!item || !isa<XQueryContextItem>(item)) return nullptr;
+  const XQueryTypeDeclaration& type = expr->type();
+  auto* test = dyn_cast<XQueryNameTest>(type.data());
+  const bool fits = type.type() == XQueryTypeDeclaration::ElementTest && type.acceptsCount(1) &&
+                    test && !test->mayRaise();
+  return Ref<XQueryNameTest>(fits ? test : nullptr);
+}
+
+bool addNames(const XQueryExpr& condition, XQueryNameChoice& names) {
+  if (const XQueryAxisStep* step = nameStepIn(&condition)) {
+    if (step->axis() != XQueryAxisSelf) return false;
+    names.addTest(By::Test, testOf(*step));
+    return true;
+  }
+  if (auto test = elementAskedFor(condition)) {
+    names.addTest(By::Element, std::move(test));
+    return true;
+  }
+  const auto known = XQueryNameConditionIn(condition);
+  if (!known) return false;
+  for (const Ref<NSString>& text : known->texts) {
+    // What has no name has the empty one.
+    if (text->length() == 0) return false;
+    names.addText(known->by, text);
+  }
+  return true;
+}
+
 // The names that a predicate asks for; empty for one that asks for anything else.
 XQueryNameChoice namesAskedFor(const XQueryExpr& predicate) {
-  XQueryNameChoice names;
-  const auto add = [&](const XQueryExpr& condition) {
-    if (const XQueryAxisStep* step = nameStepIn(&condition)) {
-      if (step->axis() != XQueryAxisSelf) return false;
-      names.addTest(testOf(*step));
-      return true;
-    }
-    const auto known = XQueryNameConditionIn(condition);
-    if (!known) return false;
-    for (const Ref<NSString>& text : known->texts) {
-      // What has no name has the empty one.
-      if (text->length() == 0) return false;
-      names.addText(known->by, text);
-    }
-    return true;
-  };
   const auto isOr = [](const XQueryExpr& expr) { return isOperator(expr, XQueryOperatorOr); };
-  return forEachOperand(&predicate, isOr, add) ? names : XQueryNameChoice();
+  const auto isAnd = [](const XQueryExpr& expr) { return isOperator(expr, XQueryOperatorAnd); };
+  XQueryNameChoice names;
+  const auto addAlternative = [&](const XQueryExpr& alternative) {
+    XQueryNameChoice all;
+    const auto meet = [&](const XQueryExpr& condition) {
+      XQueryNameChoice those;
+      if (!addNames(condition, those) || those.count() * (all.count() + 1) > mostNames)
+        return false;
+      if (all.isEmpty()) {
+        all = std::move(those);
+      } else {
+        all.meet(those);
+      }
+      return true;
+    };
+    if (!forEachOperand(&alternative, isAnd, meet)) return false;
+    names.add(all);
+    return names.count() <= mostNames;
+  };
+  return forEachOperand(&predicate, isOr, addAlternative) ? names : XQueryNameChoice();
+}
+
+// The names that a wildcard takes; empty for any other test, and where those are not known.
+XQueryNameChoice namesOfWildCard(const XQueryExpr* test) {
+  XQueryNameChoice names;
+  const auto* wildCard = dyn_cast<XQueryWildCardNameTest>(test);
+  if (!wildCard || wildCard->mayRaise()) return names;
+  if (wildCard->localName() && !wildCard->prefix()) {
+    names.addText(By::LocalName, wildCard->localName());
+  } else if (wildCard->prefix() && !wildCard->localName()) {
+    Ref<NSString> URI = wildCard->uriForContext(nullptr);
+    if (URI && URI->length() != 0) names.addText(By::URI, std::move(URI));
+  }
+  return names;
 }
 
 // Whether the test accepts a node by its kind.
@@ -154,6 +209,12 @@ class Search {
   void lookAt(XQueryPlaceID place, XQueryWalkedPath& path) {
     auto& steps = path.changeableSteps();
     for (size_t i = 0; i < steps.size(); ++i) {
+      XQueryNameChoice names = namesOfWildCard(steps[i].test);
+      if (!names.isEmpty()) {
+        steps[i].becomeAxisStep(steps[i].axis, std::move(names));
+        _planning.choose(place, "a wildcard is looked up among the names of the tree");
+        continue;
+      }
       // An expression behind it counts the nodes that are left.
       if (i + 1 < steps.size() && steps[i + 1].isExpression()) continue;
       if (!steps[i].isExpression()) {
@@ -175,7 +236,7 @@ class Search {
   }
 
   void takeFilter(XQueryPlaceID path, const XQueryWalkedPath& walk, XQueryWalkedStep& step) {
-    if (!asksForKindAlone(step.test) || step.step->predicates().empty()) return;
+    if (step.choice || !asksForKindAlone(step.test) || step.step->predicates().empty()) return;
     const XQueryPlaceID place = partOf(path, *step.step, XQueryRole::Predicate);
     if (place == XQueryNoPlace || !_planning.isOpen(place)) return;
     XQueryNameChoice names = namesAskedFor(*_planning.program[place].expr);
@@ -195,7 +256,7 @@ class Search {
       const XQueryAxisStep* found = nameStepIn(&operand);
       if (!found || (axis != 0 && found->axis() != axis)) return false;
       axis = found->axis();
-      names.addTest(testOf(*found));
+      names.addTest(By::Test, testOf(*found));
       return axis == XQueryAxisChild || axis == XQueryAxisAttribute;
     };
     if (!forEachOperand(_planning.program[place].expr, isUnion, add)) return;
@@ -219,7 +280,7 @@ class Search {
       const XQueryAxisStep* name = path ? lastNameFromRoot(*path) : nullptr;
       if (!name || (first && !leadAlike(*first, *path))) return false;
       if (!first) first = path;
-      names.addTest(testOf(*name));
+      names.addTest(By::Test, testOf(*name));
       return true;
     };
     if (!forEachOperand(_planning.program[place].expr, isUnion, add)) return;
