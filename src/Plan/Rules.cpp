@@ -18,6 +18,8 @@ constexpr std::array rules = {
                XQueryCompareNames},
     XQueryRule{"invariants", "what does not change in a loop is kept from one turn to the next",
                XQueryKeepInvariants},
+    XQueryRule{"earlier items", "what is equal before a position is found in a table",
+               XQueryCompareEarlierItems},
     XQueryRule{"sets", "the items of a long side of a comparison are found by their values",
                XQueryCompareWithSets},
     XQueryRule{"counts", "nodes are counted, or found to be there, without a list of them",

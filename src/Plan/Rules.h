@@ -29,6 +29,7 @@ void XQueryTakeNames(XQueryPlanning& planning);
 void XQueryTakePositions(XQueryPlanning& planning);
 void XQueryCompareNames(XQueryPlanning& planning);
 void XQueryKeepInvariants(XQueryPlanning& planning);
+void XQueryCompareEarlierItems(XQueryPlanning& planning);
 void XQueryCompareWithSets(XQueryPlanning& planning);
 void XQueryJoinForClauses(XQueryPlanning& planning);
 void XQueryJoinQuantifiers(XQueryPlanning& planning);

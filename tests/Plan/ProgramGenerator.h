@@ -424,6 +424,7 @@ class ProgramGenerator {
     }
     if (_random.below(5) == 0) return conditional(depth);
     if (_random.below(5) == 0) return chain();
+    if (_random.below(6) == 0) return earlier();
     std::string text = "for $u in " + many() + " ";
     return "(" + text +
            within("$u",
@@ -469,6 +470,16 @@ class ProgramGenerator {
       text += conditions[left - 1] + (left > 1 ? " and " : "");
     }
     return text + " return " + _random.oneOf({"$u", "$z", "<b>{$u, $z}</b>"}) + ")";
+  }
+
+  // What has come up before in a list.
+  std::string earlier() {
+    const std::string step = _random.oneOf({"", "/@x", "/@y", "/*", "/.."});
+    const std::string sides = _random.oneOf({"$u", "$u/@x", "$u/*", "$o/@x", "'1'", "2"}) +
+                              " = $l[" + _random.oneOf({"position() < $n", "$n >= position()"}) +
+                              "]" + step;
+    return "(let $l := " + many() + " for $u at $n in " + _random.oneOf({"$l", "$l", "($l, $l)"}) +
+           " where " + _random.oneOf({"", "not"}) + "(" + sides + ") return $u)";
   }
 
   std::string negatedFor(const std::string& kind, const std::string& condition) {

@@ -341,17 +341,18 @@ template <class Visit>
 void XQueryJoinTable::forEachMet(const Question& question, bool wantsFirst, Visit visit) {
   switch (question.way) {
     case Way::Nodes:
-      return forEachEqual(_nodes, question.nodes, _nodeBuckets, false, visit);
+      return forEachEqual(_nodes, question.nodes, _nodeBuckets, {false, wantsFirst}, visit);
     case Way::Texts:
       if (_relation.test == XQueryRelation::Equal) {
-        return forEachEqual(_texts, question.texts, _textBuckets, false, visit);
+        return forEachEqual(_texts, question.texts, _textBuckets, {false, wantsFirst}, visit);
       }
       return forEachOrdered(_texts, question.texts, _textOrder, {false, wantsFirst}, visit);
     case Way::Numbers:
     case Way::NumbersButTies: {
       const bool areTiesOpen = question.way == Way::NumbersButTies;
       if (_relation.test == XQueryRelation::Equal) {
-        return forEachEqual(_numbers, question.numbers, _numberBuckets, areTiesOpen, visit);
+        return forEachEqual(_numbers, question.numbers, _numberBuckets, {areTiesOpen, wantsFirst},
+                            visit);
       }
       return forEachOrdered(_numbers, question.numbers, _numberOrder, {areTiesOpen, wantsFirst},
                             visit);
@@ -570,14 +571,16 @@ std::span<const uint32_t> XQueryJoinTable::metInOrder(XQueryRelation relation,
 
 template <class Key, class Visit>
 void XQueryJoinTable::forEachEqual(const std::vector<Key>& keys, const std::vector<Key>& probes,
-                                   Buckets& buckets, bool areTies, Visit visit) {
+                                   Buckets& buckets, Asked asked, Visit visit) {
   if (probes.empty()) return;
   if (!buckets.isBuilt()) buckets.build(keys);
   WorkPacer pacer;
   for (const Key& probe : probes) {
     for (const uint32_t key : buckets.at(hashOf(probe))) {
       pacer.turn();
-      if (isEqual(keys[key], probe) && !visit(key, areTies)) return;
+      if (!isEqual(keys[key], probe)) continue;
+      if (!visit(key, asked.areTiesOpen)) return;
+      if (asked.wantsFirst && !asked.areTiesOpen) break;
     }
   }
 }

@@ -166,7 +166,7 @@ class XQueryJoinTable final : public XQueryKeptValue {
   void forEachMet(const Question& question, bool wantsFirst, Visit visit);
   template <class Key, class Visit>
   void forEachEqual(const std::vector<Key>& keys, const std::vector<Key>& probes, Buckets& buckets,
-                    bool areTies, Visit visit);
+                    Asked asked, Visit visit);
   template <class Key, class Visit>
   void forEachOrdered(const std::vector<Key>& keys, const std::vector<Key>& probes, Order& order,
                       Asked asked, Visit visit);

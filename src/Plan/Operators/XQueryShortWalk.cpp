@@ -18,16 +18,20 @@ bool XQueryShortWalk::readFrom(const XQueryExpr& expr) {
       step = step->next();
       if (!origin) return false;
     }
-    for (; step; step = step->next()) {
-      const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
-      if (!axisStep || !readStep(*axisStep)) return false;
-    }
-    if (_count == 0) return false;
+    if (!step || !readSteps(step)) return false;
   }
   if (!origin || isa<XQueryContextItem>(origin)) return true;
   const auto* variable = dyn_cast<XQueryVariable>(origin);
   _varID = variable ? variable->varID() : 0;
   return _varID != 0;
+}
+
+bool XQueryShortWalk::readSteps(const XQueryStep* step) {
+  for (; step; step = step->next()) {
+    const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
+    if (!axisStep || !readStep(*axisStep)) return false;
+  }
+  return true;
 }
 
 bool XQueryShortWalk::readStep(const XQueryAxisStep& step) {

@@ -31,7 +31,12 @@ class XQueryShortWalk {
 
   // Whether it starts from the context item.
   bool startsFromFocus() const { return _varID == 0; }
-  // Whether it is open for a start that is a node.
+
+  // The same of steps behind something else, which may be none.
+  [[nodiscard]] bool readSteps(const XQueryStep* step);
+  bool isEmpty() const { return _count == 0; }
+
+  // Whether names need not be resolved in the namespaces of the context.
   bool isOpen(const XQueryContext& context) const {
     return !_needsNoDefaultNamespace || !context._internal().hasDefaultNamespace();
   }

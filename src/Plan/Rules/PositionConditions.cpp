@@ -12,15 +12,12 @@
 #include <utility>
 
 namespace xquery {
-namespace {
 
-bool isPosition(const XQueryExpr* expr) {
+bool XQueryIsPosition(const XQueryExpr* expr) {
   const auto* call = dyn_cast<XQueryFunctionCall>(XQueryWithoutParentheses(expr));
   const size_t count = call && call->args() ? call->args()->count() : 0;
   return call && call->builtIn() && call->function() == fn_position && count == 0;
 }
-
-}  // namespace
 
 std::optional<int64_t> XQuerySmallIntegerIn(const XQueryExpr* expr) {
   const auto* literal = dyn_cast<XQueryLiteral>(XQueryWithoutParentheses(expr));
@@ -52,8 +49,8 @@ std::optional<XQueryPositionCondition> XQueryPositionConditionIn(const XQueryExp
   const int type = comparison->operatorType();
   const int operatorClass = XQueryOperatorExpr::operatorClassification(type);
   if (operatorClass != 5 && operatorClass != 6) return std::nullopt;
-  const bool isOnLeft = isPosition(comparison->left());
-  if (!isOnLeft && !isPosition(comparison->right())) return std::nullopt;
+  const bool isOnLeft = XQueryIsPosition(comparison->left());
+  if (!isOnLeft && !XQueryIsPosition(comparison->right())) return std::nullopt;
   const auto number = XQuerySmallIntegerIn(isOnLeft ? comparison->right() : comparison->left());
   if (!number) return std::nullopt;
   return XQueryPositionCondition{isOnLeft ? type : XQueryMirroredComparison(type), *number};

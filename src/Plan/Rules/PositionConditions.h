@@ -14,6 +14,9 @@ std::optional<int64_t> XQuerySmallIntegerIn(const XQueryExpr* expr);
 // The comparison that the operands of another one stand in when they change sides.
 int XQueryMirroredComparison(int type);
 
+// Whether it is a call of position().
+bool XQueryIsPosition(const XQueryExpr* expr);
+
 // "position() = 3", "3 >= position()" with the position on the left.
 struct XQueryPositionCondition {
   int comparison;
