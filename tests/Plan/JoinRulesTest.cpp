@@ -84,6 +84,26 @@ TEST(ForJoins, UseAConditionAtTheEarliestClauseThatBindsWhatItReads) {
             "xs:integer 11");
 }
 
+TEST(ForJoins, FindTextsByTheirBeginning) {
+  for (const char* text : {
+           "for $n in ('i', 'i1', '', 'x') return for $s in //s where starts-with($s/@i, $n) "
+           "return $s",
+           "for $p in //p return //s[starts-with(@i, concat('i', $p/@n))]/@v",
+           "for $p in //p where some $s in //s satisfies starts-with($s/@v, $p/@n) return $p/@id",
+           "for $c in (1 to 5) return //s[@i = concat('i', $c)][starts-with(@v, string($c))]",
+       }) {
+    EXPECT_EQ(joinsIn(text), 1U) << text;
+    resultOf(text);
+  }
+  for (const char* text : {
+           "for $p in //p return //s[starts-with($p/@id, @i)]",
+           "for $p in //p return for $s in //s where starts-with($s/@i, 'i1', 'none') return $s",
+       }) {
+    EXPECT_EQ(joinsIn(text), 0U) << text;
+    resultOf(text);
+  }
+}
+
 // What another comparison of the same clause leaves out is left out although nothing is known of
 // the kinds of the first, as long as a table answers that one.
 TEST(ForJoins, ComeTogetherInAnyOrder) {

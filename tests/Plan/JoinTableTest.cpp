@@ -166,6 +166,34 @@ TEST(JoinTable, TheFirstSureItemIsEnoughWhereThatIsAskedFor) {
   EXPECT_EQ(selection, (XQueryJoinTable::Selection{{1, false}, {2, true}}));
 }
 
+TEST(JoinTable, TextsBeginWithAProbe) {
+  auto prefix = condition(less, false, true);
+  prefix.isPrefix = true;
+  std::vector<Value> keys = {
+      untyped("ab"), string("a"),  untyped("b"), integer(1),
+      empty(),       untyped("é"), untyped(""),  sequence({string("a"), string("ab")})};
+  EXPECT_EQ(selected(prefix, keys, string("a")), "0 1 3? 4? 7?");
+  EXPECT_EQ(selected(prefix, keys, untyped("é")), "3? 4? 5 7?");
+  EXPECT_EQ(selected(prefix, keys, string("")), "0 1 2 3? 4? 5 6 7?");
+  EXPECT_EQ(selected(prefix, keys, integer(1)), "plain");
+  EXPECT_EQ(selected(prefix, keys, empty()), "plain");
+  EXPECT_EQ(selected(prefix, keys, sequence({string("a"), string("b")})), "plain");
+  for (int i = 0; i < 100; ++i) keys.push_back(untyped(std::to_string(i * 37 % 100)));
+  XQueryJoinTable table = tableOf(prefix, keys);
+  for (int round = 0; round < 30; ++round) {
+    for (const char* probe : {"", "a", "3", "37", "99", "z"}) {
+      XQueryJoinTable::Selection selection;
+      ASSERT_TRUE(select(table, string(probe), selection));
+      std::string text;
+      for (const auto& pick : selection) {
+        text +=
+            (text.empty() ? "" : " ") + std::to_string(pick.position) + (pick.isSure ? "" : "?");
+      }
+      EXPECT_EQ(text, selected(prefix, keys, string(probe))) << probe << " in round " << round;
+    }
+  }
+}
+
 TEST(JoinTable, EstimatesNoFewerThanItFinds) {
   std::vector<Value> keys;
   for (int i = 0; i < 100; ++i) keys.push_back(untyped(std::to_string(i % 10)));

@@ -86,6 +86,7 @@ class Generator : public RandomChoices {
   std::string comparison(const std::string& key, const std::string& probe) {
     const std::string sign =
         oneOf({"=", "=", "=", "<", "<=", ">", ">=", "eq", "lt", "le", "gt", "ge", "!="});
+    if (below(12) == 0) return "starts-with(" + key + ", " + probe + ")";
     return below(2) ? key + " " + sign + " " + probe : probe + " " + sign + " " + key;
   }
   std::string items() {

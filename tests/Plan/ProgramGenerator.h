@@ -391,6 +391,7 @@ class ProgramGenerator {
       return "(some $w in " + item + _random.oneOf({"/*", "/@*", "/.."}) + " satisfies " +
              keyOf("$w") + _random.oneOf(operators) + other + ")";
     }
+    if (_random.below(8) == 0) return "starts-with(" + keyOf(item) + ", " + other + ")";
     return _random.below(2) ? keyOf(item) + _random.oneOf(operators) + other
                             : other + _random.oneOf(operators) + keyOf(item);
   }

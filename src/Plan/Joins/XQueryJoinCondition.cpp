@@ -6,6 +6,7 @@
 #include "Expr/XQueryLists.h"
 #include "Functions/Boolean.h"
 #include "Functions/Sequence.h"
+#include "Functions/Substring.h"
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Joins/XQueryInnerKeys.h"
 #include "Plan/Joins/XQueryJoinedSteps.h"
@@ -40,9 +41,9 @@ bool isNotEqual(const XQueryRelation& relation) {
 
 // How much a comparison promises to exclude. One that is the same in every round excludes the same
 // items each time, which says nothing about how many.
-int promiseOf(const XQueryRelation& relation, const XQueryFacts& probe) {
-  if (isNotEqual(relation)) return 0;
-  if (relation.test != XQueryRelation::Equal) return 1;
+int promiseOf(const XQueryJoinRelation& by, const XQueryFacts& probe) {
+  if (isNotEqual(by.relation)) return 0;
+  if (by.relation.test != XQueryRelation::Equal && !by.isPrefix) return 1;
   const bool differs =
       probe.does(XQueryDeeds::ReadsFocus | XQueryDeeds::ReadsGlobals) || !probe.reads.isEmpty();
   return differs ? 3 : 2;
@@ -283,11 +284,33 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfPath(XQueryPlaceID pl
   return isJoin ? found : Comparison();
 }
 
+// "starts-with(K, P)": each is one text, or the condition is asked as it was written.
+XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfPrefix(XQueryPlaceID place) const {
+  const auto* call = cast<XQueryFunctionCall>(at(place).expr);
+  if (!call->args() || call->args()->count() != 2) return {};
+  const XQueryPlaceID key =
+      _planning.program.firstPart(_planning.program.part(place, XQueryRole::Arguments));
+  const XQueryPlaceID probe = _planning.program.nextPart(key);
+  const bool isJoin = _scope.readsOf(facts(key)) == XQueryJoinReads::Item &&
+                      _scope.readsOf(facts(probe)) == XQueryJoinReads::Round;
+  if (!isJoin) return {};
+  Comparison found;
+  found.relation.relation = {XQueryRelation::Less, false};
+  found.relation.isPrefix = true;
+  found.relation.isValueComparison = true;
+  found.key = _planning.exprAt(key);
+  found.probe = _planning.exprAt(probe);
+  found.keyFacts = facts(key);
+  found.probeFacts = facts(probe);
+  return found;
+}
+
 XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonAt(XQueryPlaceID place) const {
   if (isa<XQueryQuantifiedExpr>(at(place).expr)) return comparisonOfSome(place);
   if (isa<XQueryPathExpr>(at(place).expr)) return comparisonOfPath(place);
   if (const auto* call = dyn_cast<XQueryFunctionCall>(at(place).expr)) {
     if (call->functionDecl()) return comparisonOfCall(place);
+    if (call->function() == fn_starts_with) return comparisonOfPrefix(place);
     const bool asksForTruth = call->function() == fn_exists || call->function() == fn_boolean;
     if (!asksForTruth || !call->args() || call->args()->count() != 1) return {};
     const XQueryPlaceID arguments = _planning.program.part(place, XQueryRole::Arguments);
@@ -435,7 +458,7 @@ XQueryJoinTerm XQueryJoinSearch::made(const Comparison& comparison) const {
     term.key = XQueryJoinKeys::exprWithClauses(std::move(clauses), term.key, isOfEach);
   }
   term.probe = comparison.probe;
-  term.promise = promiseOf(comparison.relation.relation, comparison.probeFacts);
+  term.promise = promiseOf(comparison.relation, comparison.probeFacts);
   term.looksOutOfItems =
       term.looksOutOfItems || comparison.keyFacts.does(XQueryDeeds::ReadsOutside);
   if (comparison.probeFacts.does(XQueryDeeds::ReadsOutside)) term.outward = comparison.probeFacts;

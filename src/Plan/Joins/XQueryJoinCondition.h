@@ -107,6 +107,7 @@ class XQueryJoinSearch {
                                  const XQueryJoinScope& scope);
   Comparison operandsAt(XQueryPlaceID place, const XQueryJoinScope& scope) const;
   Comparison comparisonOfCall(XQueryPlaceID place) const;
+  Comparison comparisonOfPrefix(XQueryPlaceID place) const;
   Comparison comparisonOfPath(XQueryPlaceID place) const;
   bool describePartOfCall(XQueryPlaceID call, XQueryPlaceID body, XQueryPlaceID part,
                           Operand& operand) const;

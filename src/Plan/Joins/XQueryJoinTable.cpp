@@ -14,25 +14,12 @@
 #include <functional>
 #include <limits>
 #include <numeric>
+#include <type_traits>
 
 namespace xquery {
 namespace {
 
-// Every integer below this magnitude is a double and no other integer is the same double.
-constexpr double exactIntegerBound = 1LL << std::numeric_limits<double>::digits;
 constexpr double notANumber = std::numeric_limits<double>::quiet_NaN();
-
-// NaN, whichever way it is stored, meets nothing.
-bool isFloating(const NSNumber& number) {
-  return std::isnan(number.doubleValue()) || number.storage() == NSNumber::Storage::Double ||
-         number.storage() == NSNumber::Storage::Float;
-}
-
-bool isExactAsDouble(const NSNumber& number) {
-  const NSDecimal* decimal = number.storedDecimal();
-  if (decimal && !decimal->isSmallInteger()) return false;
-  return std::abs(number.doubleValue()) < exactIntegerBound;
-}
 
 uint32_t hashOf(double value) {
   // The two zeros are equal.
@@ -123,31 +110,6 @@ void arrange(XQueryJoinTable::Selection& selection) {
 
 }  // namespace
 
-// --- operands ------------------------------------------------------------------------------------
-
-XQueryJoinTable::Operand::Operand(NSObject* item) {
-  if (!item) return;
-  const XQueryTypeID type =
-      item->isNode() ? XQueryTypeID{XQueryTypeUntypedAtomic} : XQueryObjectTypeID(item);
-  const XQueryTypeID primitive = XQueryPrimitiveTypeForTypeID(type);
-  if (type == XQueryTypeUntypedAtomic || type == XQueryTypeString) {
-    kind = type == XQueryTypeString ? Text : Untyped;
-    text = XQueryUntypedText(*item);
-  } else if (primitive >= XQueryTypeDouble && primitive <= XQueryTypeDecimal) {
-    const auto& value = *cast<NSNumber>(item);
-    number = value.doubleValue();
-    kind = isFloating(value) ? Floating : isExactAsDouble(value) ? ExactDecimal : InexactDecimal;
-  }
-}
-
-bool XQueryJoinTable::Operand::scan() {
-  return kind == Untyped ? scanDouble(text.view(), number) : isNumber();
-}
-
-bool XQueryJoinTable::Operand::isNaN() const {
-  return kind == Floating && std::isnan(number);
-}
-
 template <class Key>
 void XQueryJoinTable::Buckets::build(const std::vector<Key>& keys) {
   const size_t buckets = std::bit_ceil(2 * keys.size() + 1);
@@ -177,6 +139,7 @@ XQueryJoinTable::XQueryJoinTable(const XQueryJoinRelation& by, Items items, cons
       _isValueComparison(by.isValueComparison),
       _isComplement(by.isComplement),
       _isIdentity(by.isIdentity),
+      _isPrefix(by.isPrefix),
       _wantsOneKey(by.isValueComparison && !by.keysAreOfEach),
       _wantsOneProbe(by.isValueComparison && !by.probesAreOfEach),
       _items(std::move(items)) {
@@ -244,6 +207,8 @@ bool XQueryJoinTable::readNode(uint32_t position, const XQueryItemList& keys) {
 // item without keys meets nothing.
 bool XQueryJoinTable::takes(const Operands& keys) {
   if (_isComplement && (keys.size() != 1 || keys.front().isNaN())) return false;
+  // What is nothing begins as the empty text does.
+  if (_isPrefix && (keys.empty() || !keys.front().isText())) return false;
   if (keys.empty()) return true;
   if (_wantsOneKey && keys.size() > 1) return false;
   const auto isText = [](const Operand& key) { return key.isText(); };
@@ -301,6 +266,7 @@ XQueryJoinTable::Way XQueryJoinTable::wayFor(const Value& probe, Operands& probe
     if (probes.back().kind == Operand::Other) return Way::Plain;
     if (_isComplement && probes.back().isNaN()) return Way::Plain;
   }
+  if (_isPrefix && (probes.empty() || !probes.front().isWholeText())) return Way::Plain;
   if (probes.empty() || _keys.empty()) return Way::Nothing;
   const auto isText = [](const Operand& operand) { return operand.isText(); };
   if (_holdsTexts && std::all_of(probes.begin(), probes.end(), isText)) return Way::Texts;
@@ -454,7 +420,7 @@ std::optional<bool> XQueryJoinTable::isMet(const std::vector<Key>& keys,
       const int order = orderOf(keys[key], probes.front());
       if (areTiesOpen && order == 0) {
         isOpen = true;
-      } else if (_relation.holds(order)) {
+      } else if (holds(_relation, keys[key], probes.front())) {
         return true;
       }
     }
@@ -539,16 +505,25 @@ void XQueryJoinTable::forEachOrdered(const std::vector<Key>& keys, const std::ve
   }
   for (size_t key = 0; key < keys.size(); ++key) {
     pacer.turn();
-    if (meetsNothing(keys[key]) || !relation.holds(orderOf(keys[key], probe))) continue;
+    if (meetsNothing(keys[key]) || !holds(relation, keys[key], probe)) continue;
     if (!visit(key, isTie(key)) || (asked.wantsFirst && !isTie(key))) return;
   }
 }
 
-// The keys that meet a probe are the first ones in their order, or the last ones.
+template <class Key>
+bool XQueryJoinTable::holds(XQueryRelation relation, const Key& key, const Key& probe) const {
+  if constexpr (std::is_same_v<Key, NSStringView>) {
+    if (_isPrefix) return key.startsWith(probe);
+  }
+  return relation.holds(orderOf(key, probe));
+}
+
+// The keys that meet a probe are the first ones in their order, or the last ones; those that begin
+// with it stand in a row.
 template <class Key>
 std::span<const uint32_t> XQueryJoinTable::metInOrder(XQueryRelation relation,
                                                       const std::vector<Key>& keys,
-                                                      const Key& probe, Order& order) {
+                                                      const Key& probe, Order& order) const {
   std::vector<uint32_t>& sorted = order.keys;
   if (sorted.empty()) {
     for (size_t key = 0; key < keys.size(); ++key) {
@@ -560,10 +535,15 @@ std::span<const uint32_t> XQueryJoinTable::metInOrder(XQueryRelation relation,
       return orderOf(keys[a], keys[b]) < 0;
     });
   }
+  const auto isMet = [&](uint32_t key) { return holds(relation, keys[key], probe); };
+  if (_isPrefix) {
+    const auto isBefore = [&](uint32_t key) { return orderOf(keys[key], probe) < 0; };
+    const auto first = std::partition_point(sorted.begin(), sorted.end(), isBefore);
+    return {first, std::partition_point(first, sorted.end(), isMet)};
+  }
   const bool fromLeast = (relation.test == XQueryRelation::Less) != relation.negated;
-  const auto border = std::partition_point(sorted.begin(), sorted.end(), [&](uint32_t key) {
-    return relation.holds(orderOf(keys[key], probe)) == fromLeast;
-  });
+  const auto border = std::partition_point(sorted.begin(), sorted.end(),
+                                           [&](uint32_t key) { return isMet(key) == fromLeast; });
   const std::span<const uint32_t> all(sorted);
   const auto count = static_cast<size_t>(border - sorted.begin());
   return fromLeast ? all.first(count) : all.subspan(count);

@@ -15,9 +15,9 @@
 
 #include "Context/KeptValues.h"
 #include "Expr/Operators/XQueryComparison.h"
-#include "Types/XQueryUntypedText.h"
 #include "Expr/XQueryPicker.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Joins/XQueryJoinOperand.h"
 #include "xquery/Object.h"
 
 #include <algorithm>
@@ -36,6 +36,8 @@ struct XQueryJoinRelation {
   XQueryRelation relation{};  // of a key to a probe
   // A value comparison wants one item on each side, a general one takes any number.
   bool isValueComparison = false;
+  // starts-with(): whether a key begins with a probe. The relation above is then an order.
+  bool isPrefix = false;
   // "is": whether both sides are the same node.
   bool isIdentity = false;
   // There are several value comparisons, any of which may hold: one for each key, for each probe.
@@ -95,21 +97,7 @@ class XQueryJoinTable final : public XQueryKeptValue {
   std::optional<bool> meets(const Value& probe);
 
  private:
-  // What a key or a probe is compared as.
-  struct Operand {
-    enum Kind : uint8_t { Other, Untyped, Text, Floating, ExactDecimal, InexactDecimal };
-    Kind kind = Other;
-    XQueryUntypedText text;  // of an untyped one and a text
-    double number = 0;       // of a number; of an untyped one once it is scanned
-
-    explicit Operand(NSObject* item);
-    bool isText() const { return kind == Untyped || kind == Text; }
-    bool isDecimal() const { return kind == ExactDecimal || kind == InexactDecimal; }
-    bool isNumber() const { return kind == Floating || isDecimal(); }
-    bool isNaN() const;
-    // Makes an untyped one a number; false when it begins with none.
-    bool scan();
-  };
+  using Operand = XQueryJoinOperand;
   using Operands = std::vector<Operand>;
 
   // The keys by their hash, those of one bucket in their order.
@@ -171,14 +159,17 @@ class XQueryJoinTable final : public XQueryKeptValue {
   void forEachOrdered(const std::vector<Key>& keys, const std::vector<Key>& probes, Order& order,
                       Asked asked, Visit visit);
   template <class Key>
-  static std::span<const uint32_t> metInOrder(XQueryRelation relation, const std::vector<Key>& keys,
-                                              const Key& probe, Order& order);
+  bool holds(XQueryRelation relation, const Key& key, const Key& probe) const;
+  template <class Key>
+  std::span<const uint32_t> metInOrder(XQueryRelation relation, const std::vector<Key>& keys,
+                                       const Key& probe, Order& order) const;
   void countMemory();
 
   const XQueryRelation _relation;
   const bool _isValueComparison;
   const bool _isComplement;
   const bool _isIdentity;
+  const bool _isPrefix;
   const bool _wantsOneKey;
   const bool _wantsOneProbe;
   bool _isComplete = true;

@@ -2,9 +2,10 @@
 //
 // Pattern     for $x in X ... where ... K = P ...; for $x in X ... return if (... K = P ...) then T
 //             else (); sum(for $x in X ... return if (... K = P ...) then T else 0); also <, <=, >,
-//             >=, the value comparisons and "is", on either side, among conditions that "and"
-//             joins; K follows from $x, directly, through let and for clauses behind it, or as
-//             "some $y in K satisfies $y = P"; P does not read $x, nor what later clauses set
+//             >=, the value comparisons, "is", on either side, and starts-with(K, P), among
+//             conditions that "and" joins; K follows from $x, directly, through let and for clauses
+//             behind it, or as "some $y in K satisfies $y = P"; P does not read $x, nor what later
+//             clauses set
 // Facts       K, P, the conditions before the comparison and the clauses behind $x are repeatable;
 //             a condition before it reads $x alone, or nothing that is set for $x, or cannot fail;
 //             so do the clauses behind $x; what these leave in variables cannot be told; in a sum
