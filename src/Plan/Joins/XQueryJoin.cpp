@@ -196,7 +196,8 @@ bool XQueryJoin::addTable(Tables& tables, XQueryContext& context) const {
     if (_varID == 0) dynamic.setContextItem(item, position);
     if (!made->isComplete()) continue;
     tables.next = nextOfAll;
-    tables.byTerm[term] = std::move(made);
+    // Reading keys may have begun other rounds over the same items, some of which are being asked.
+    if (!tables.byTerm[term]) tables.byTerm[term] = std::move(made);
     return true;
   }
   return false;
