@@ -133,6 +133,8 @@ TEST(TakeNames, TakesOverFiltersAndUnions) {
         "//a/(@x | @y)[1]",
         "//(a | b)[@x]/..",
         "//*[(self::a) or (self::b)]",
+        "//*/(parent::a | parent::c)",
+        "//@*/(self::x | self::y)",
         "//*[self::a and self::b]",
         "//*:a",
         "//@*:x",
@@ -309,10 +311,47 @@ TEST(TakeFirst, EndsAtTheLastNodeThatIsAskedFor) {
 TEST(TakeFirst, LeavesAloneWhatMayComeInAnotherOrder) {
   for (const char* text :
        {"(//a/b)[1]", "(//a/ancestor::*)[1]", "subsequence(//a//b, 1, 1)", "(//b/..)[1]",
-        "(a/preceding-sibling::*)[1]", "(//a[2])[1]", "(//a)[last()]", "(//a)[0]",
+        "(a/preceding-sibling::*)[1]", "(//b//a[2])[1]", "(//a)[last()]", "(//a)[0]",
         "(//*/following::b)[1]", "subsequence(//a, 1.5, 1)"}) {
     EXPECT_EQ(operatorsOf("first", text), 0U) << text;
     resultOf(text, names());
+  }
+}
+
+// --- walks ---------------------------------------------------------------------------------------
+
+TEST(KeepTrails, CountsSiblingsBelowOneNode) {
+  const Value nested = document(
+      "<r><a><a x='1'/><b><a/><a y='2'/></b><a x='3'/></a><b/><a><b/><a/><b><b/></b></a><a/></r>");
+  for (const char* step :
+       {"a[1]", "a[2]", "a[3]", "*[2]", "b[1]", "a[2][@y]", "a[1][@x]/..", "a[0]", "a[2.5]",
+        "(a | b)[2]", "*[self::b][2]", "node()[2]", "a[1]//a[1]", "a[2]/@x", "a[1][b or @x]",
+        "a[2][1]", "a[1][position() = 1]", "a[1]/last()", "a[position() = 2]"}) {
+    for (const Value& tree : {names(), manyNames(), nested}) {
+      resultOf(std::string("//") + step, tree);
+      resultOf(std::string("count(//") + step + ")", tree);
+      resultOf(std::string("exists(//") + step + ")", tree);
+      resultOf(std::string("(//") + step + ")[1]", tree);
+      resultOf(std::string("for $i in //*[3] return $i//") + step, tree);
+      resultOf(std::string("//b//") + step, tree);
+      resultOf(std::string("unordered {//") + step + "}", tree);
+    }
+    resultOf(std::string("let $t := <r><a/><b><a/></b><a/></r> return ($t//") + step +
+             ", <q>{$t}</q>//" + step + ")");
+  }
+  EXPECT_EQ(choicesOf("walks", "//a[2]"), 1U);
+  EXPECT_EQ(choicesOf("walks", "//a[last()]"), 0U);
+  EXPECT_EQ(choicesOf("walks", "//a[string(.)][2]"), 0U);
+}
+
+TEST(KeepTrails, KnowsQuantifiersAndFunctionsInPredicates) {
+  for (const char* text :
+       {"//a[some $x in b satisfies $x = 't']", "//a[every $x in * satisfies $x/@y]/..",
+        "declare function local:f($n) {exists($n/b)}; //*[local:f(.)]",
+        "//*[exists(for $x in b where $x/@x return $x)]"}) {
+    EXPECT_EQ(choicesOf("walks", text), 1U) << text;
+    resultOf(text, names());
+    resultOf(text, manyNames());
   }
 }
 

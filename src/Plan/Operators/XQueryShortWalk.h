@@ -23,7 +23,7 @@ class XQueryExpr;
 
 class XQueryShortWalk {
  public:
-  static constexpr size_t mostSteps = 4;
+  static constexpr size_t mostSteps = 8;
 
   // Of a path, or of "." and a local variable alone, in parentheses or not; false for any other
   // expression. Lives no longer than that expression.

@@ -86,6 +86,7 @@ void XQueryPathWalk::takeNode(size_t index, NSXMLNode* node) {
   XQueryCheckStack(context);
   if (setsEveryFocus || step.testMayRaise) context._internal().setContextItem(node, 0);
   if (absorbsNext(step, node)) {
+    if (_steps[index + 1].countsBelow) return takeCountedBelow(index + 1, node);
     const bool isChild = _steps[index + 1].axis == XQueryAxisChild;
     take(index + 1, isChild ? XQueryAxisDescendant : XQueryAxisAttributesBelow, node);
   } else {
@@ -104,7 +105,63 @@ void XQueryPathWalk::takeItem(size_t index, NSObject* item, int64_t position, bo
 }
 
 bool XQueryPathWalk::absorbsNext(const XQueryWalkedStep& step, const NSXMLNode* node) const {
-  return step.absorbsNext && orderIsFree && !setsEveryFocus && descendantsAreSubtree(node);
+  const bool isOpen =
+      step.absorbsNext && orderIsFree && !setsEveryFocus && descendantsAreSubtree(node);
+  if (!isOpen || !(&step + 1)->countsBelow) return isOpen;
+  // Parents are told apart by their order.
+  return !listingStep &&
+         (!node->firstChild() || NSXMLNode::haveComparableOrder(node, node->firstChild()));
+}
+
+// Parents that are open, the innermost last, with the number of their children met so far. Children
+// are met in document order, so that a parent that comes after another child's is done with.
+class XQueryPathWalk::ChildCounts {
+ public:
+  // The position of the node among those of its parent.
+  uint64_t countFor(const NSXMLNode* node) {
+    const NSXMLNode* parent = node->parent();
+    while (!_open.empty() && _open.back().parent != parent &&
+           isDone(*_open.back().parent, *parent)) {
+      _open.pop_back();
+    }
+    if (_open.empty() || _open.back().parent != parent) _open.push_back({parent, 0});
+    return ++_open.back().count;
+  }
+
+ private:
+  struct Parent {
+    const NSXMLNode* parent;
+    uint64_t count;
+  };
+
+  static bool isDone(const NSXMLNode& one, const NSXMLNode& next) {
+    if (one.orderNumber() > next.orderNumber()) return true;
+    const NSXMLNode* behind = one.nextSibling();
+    return behind && behind->orderNumber() <= next.orderNumber();
+  }
+
+  std::vector<Parent, ValueAllocator<Parent>> _open;
+};
+
+void XQueryPathWalk::takeCountedBelow(size_t index, NSXMLNode* node) {
+  const XQueryWalkedStep& step = _steps[index];
+  const uint64_t position = *step.step->literalPosition(step.predicatesInTest);
+  XQueryStepTest test(step, *this);
+  ChildCounts counts;
+  const auto act = [&](NSXMLNode* found) {
+    if (counts.countFor(found) != position) return true;
+    if (!keepsAlone(step, step.predicatesInTest + 1, found)) return !hasFailed;
+    takeNode(index + 1, found);
+    return !isOver();
+  };
+  if (const NSXMLExpandedName* name = test.onlyName()) {
+    XQueryWalkAxis(node, XQueryAxisDescendant, XQueryNamedVisit(name, act));
+  } else if (test.onlyNames()) {
+    XQueryWalkAxis(node, XQueryAxisDescendant, XQueryChoiceVisit(test, act));
+  } else {
+    XQueryWalkAxis(node, XQueryAxisDescendant,
+                   [&test, act](NSXMLNode* found) { return !test.matches(found) || act(found); });
+  }
 }
 
 void XQueryPathWalk::take(size_t index, int axis, NSXMLNode* node) {
@@ -122,8 +179,11 @@ bool XQueryPathWalk::filtersEach(const XQueryWalkedStep& step) const {
 }
 
 // The same as filtering a list of nodes where no predicate can tell which place a node has in it.
-bool XQueryPathWalk::keepsAlone(const XQueryWalkedStep& step, NSXMLNode* node) {
-  for (auto each = step.firstPredicate(); each != step.step->predicates().end(); ++each) {
+bool XQueryPathWalk::keepsAlone(const XQueryWalkedStep& step, size_t firstPredicate,
+                                NSXMLNode* node) {
+  const auto& predicates = step.step->predicates();
+  for (auto each = predicates.begin() + static_cast<std::ptrdiff_t>(firstPredicate);
+       each != predicates.end(); ++each) {
     const XQueryNodeQuestion* question = questionIn(each->get());
     const auto answer = question ? question->holdsFor(node, context) : std::nullopt;
     if (answer.value_or(false)) continue;
@@ -195,7 +255,7 @@ void XQueryPathWalk::streamMatching(size_t index, int axis, NSXMLNode* node, Vis
   const auto handOn = [this, &step, isLast, index](NSXMLNode* found) {
     // A trail may go on after the end.
     if (isOver()) return false;
-    if (step.hasPredicates() && !keepsAlone(step, found)) return !hasFailed;
+    if (step.hasPredicates() && !keepsAlone(step, step.predicatesInTest, found)) return !hasFailed;
     if (isLast) {
       results.addNode(found, context);
     } else {
@@ -219,8 +279,7 @@ void XQueryPathWalk::streamMatching(size_t index, int axis, NSXMLNode* node, Vis
   } else {
     XQueryWalkAnyAxis(node, axis, false, visitOf(handOn));
   }
-  // What predicates have filtered is sorted forward, also where they have become part of the test.
-  if (isLast) results.setIsReversed(step.isReverse() && step.step->predicates().empty());
+  if (isLast) results.setIsReversed(step.isReverse());
 }
 
 // Gathers the nodes found from one context item, filters them and hands on what is left.

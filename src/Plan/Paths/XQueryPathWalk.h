@@ -19,6 +19,8 @@
 //                 parent), so the child step takes the descendant axis only when no predicate can
 //                 tell, both are repeatable with all steps after them, and the results will be
 //                 sorted. "//@a" is the same.
+//   countsBelow   "//a[2]" is the same where it begins the path and starts from one node: the
+//                 descendants named a are counted by their parents, which come in document order.
 //   filtersEach   Where only some of the nodes are wanted, or their number, a step filters each
 //                 node as it finds it and hands it on, so that the walk ends as soon as the answer
 //                 is certain.
@@ -72,6 +74,7 @@ class XQueryPathWalk : public XQueryPathRun {
  private:
   void takeItem(size_t index, NSObject* item, int64_t position, bool validate);
   void take(size_t index, int axis, NSXMLNode* node);
+  void takeCountedBelow(size_t index, NSXMLNode* node);
   void stream(size_t index, int axis, NSXMLNode* node);
   template <class VisitOf>
   void streamMatching(size_t index, int axis, NSXMLNode* node, VisitOf visitOf);
@@ -79,7 +82,7 @@ class XQueryPathWalk : public XQueryPathRun {
   size_t collect(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
                  std::vector<NSXMLNode*>& nodes);
   bool filtersEach(const XQueryWalkedStep& step) const;
-  bool keepsAlone(const XQueryWalkedStep& step, NSXMLNode* node);
+  bool keepsAlone(const XQueryWalkedStep& step, size_t firstPredicate, NSXMLNode* node);
   bool filterNodes(const XQueryWalkedStep& step, size_t fromIndex, std::vector<NSXMLNode*>& nodes);
   bool keepNodes(const XQueryExpr& predicate, const XQueryNodeQuestion& question,
                  std::vector<NSXMLNode*>& nodes);
@@ -88,6 +91,7 @@ class XQueryPathWalk : public XQueryPathRun {
   // an earlier step constructs may give the nodes a parent.
   XQueryAxisTrail& trail(size_t index);
 
+  class ChildCounts;
   struct Trail {
     XQueryAxisTrail trail;
     uint64_t changeCount = 0;  // NSXMLTree::changeCount at its last use

@@ -25,7 +25,12 @@ struct XQueryWalkedStep {
 
   // An expression that is evaluated for each node.
   bool isExpression() const { return axis == 0; }
-  bool isReverse() const { return axis >= XQueryAxisAncestor && axis <= XQueryAxisAncestorOrSelf; }
+  // Whether its nodes are results in reverse order. What predicates have filtered is sorted
+  // forward, also where they have become part of the test, and so is what an expression answers.
+  bool isReverse() const {
+    return isa<XQueryAxisStep>(step) && step->predicates().empty() && axis >= XQueryAxisAncestor &&
+           axis <= XQueryAxisAncestorOrSelf;
+  }
   // Whether predicates are left that are no part of the test.
   bool hasPredicates() const { return predicatesInTest < step->predicates().size(); }
   auto firstPredicate() const {
@@ -62,6 +67,7 @@ struct XQueryWalkedStep {
 
   // See XQueryPathWalk.h.
   bool absorbsNext = false;
+  bool countsBelow = false;
   bool filtersEach = false;
   bool gathersFirst = false;
   size_t trail = noTrail;

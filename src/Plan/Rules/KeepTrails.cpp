@@ -56,7 +56,8 @@ bool arriveInOrder(const Steps& steps) {
       default:
         return false;
     }
-    for (size_t index = 0; wasOne && index < step->step->predicates().size(); ++index) {
+    for (size_t index = 0; wasOne && !step->countsBelow && index < step->step->predicates().size();
+         ++index) {
       if (step->step->asksForPosition(index)) found = Found::One;
     }
   }
@@ -94,8 +95,10 @@ class Search {
       if (step.isExpression() || step.testMayRaise || !canRepeat(i)) break;
       loadsDocuments = loadsDocuments || _of[i].loads;
       step.filtersEach = step.hasPredicates() && _of[i].areOfTruth;
-      step.absorbsNext =
-          step.isDescendantShorthand() && i + 1 < _steps.size() && mayTakeDescendants(i + 1);
+      if (step.isDescendantShorthand() && i + 1 < _steps.size()) {
+        _steps[i + 1].countsBelow = i == 0 && startsFromOne() && mayCountBelow(i + 1);
+        step.absorbsNext = _steps[i + 1].countsBelow || mayTakeDescendants(i + 1);
+      }
       if (!nodesMayGo && mayWalkTwice(i)) step.trail = findings.trailCount++;
       findings.countsNodes = i == 0 && !loadsDocuments;
     }
@@ -112,6 +115,7 @@ class Search {
     // Each keeps a node for what it finds true of it, wherever the node stands, and without loading
     // documents.
     bool areOfTruth = true;
+    bool areOfTruthBehind = true;  // the same but for the first one
     bool loads = false;
     XQueryVariableSet reads;
   };
@@ -132,9 +136,11 @@ class Search {
                          !_planning.showsLeftovers(facts.assigns, _place);
       of.readGlobals = of.readGlobals || facts.does(ReadsGlobals);
       of.loads = of.loads || facts.does(LoadsDocuments);
-      of.areOfTruth = of.areOfTruth && !step.step->asksForPosition(i) &&
-                      !facts.does(ReadsPosition | ReadsSize | LoadsDocuments) &&
-                      !facts.mayBe(XQueryItems::Numeric | XQueryItems::Other);
+      const bool isOfTruth = !step.step->asksForPosition(i) &&
+                             !facts.does(ReadsPosition | ReadsSize | LoadsDocuments) &&
+                             !facts.mayBe(XQueryItems::Numeric | XQueryItems::Other);
+      of.areOfTruth = of.areOfTruth && isOfTruth;
+      if (i > step.predicatesInTest) of.areOfTruthBehind = of.areOfTruthBehind && isOfTruth;
       of.reads.add(facts.reads);
       _assigned.add(facts.assigns);
     }
@@ -153,6 +159,19 @@ class Search {
   bool mayTakeDescendants(size_t index) const {
     const int axis = _steps[index].axis;
     return (axis == XQueryAxisChild || axis == XQueryAxisAttribute) && _of[index].areOfTruth;
+  }
+
+  // Whether the step asks for a position among siblings, and all its other predicates, which come
+  // behind, for truth.
+  bool mayCountBelow(size_t index) const {
+    const XQueryWalkedStep& step = _steps[index];
+    return step.axis == XQueryAxisChild && step.hasPredicates() &&
+           step.step->asksForPosition(step.predicatesInTest) && _of[index].areOfTruthBehind;
+  }
+
+  bool startsFromOne() const {
+    const XQueryPlaceID start = _planning.program.part(_place, XQueryRole::FirstStep);
+    return start == XQueryNoPlace || _planning.facts[start].most <= 1;
   }
 
   // Whether walks of a step from different nodes may meet the same node and nothing can tell

@@ -1,6 +1,6 @@
 // A path over a few children and attributes.
 //
-// Pattern     "$p/name", "@id", "../price/text()": up to four steps to parents, which come first,
+// Pattern     "$p/name", "@id", "../price/text()": up to eight steps to parents, which come first,
 //             to children and to attributes, by names or by text() and node(), without predicates,
 //             from the context item or a local variable; "ancestor::item" alone
 // Facts       none are asked for: at each use it is asked whether there is one node to start from

@@ -3,7 +3,7 @@
 // Pattern     *[self::a], *[self::a or self::b], *[name() = "a"], *[local-name(.) = ("a", "b")],
 //             *[string(node-name(.)) = "a"], *[string(namespace-uri()) = "u" and ...],
 //             node()[. instance of element(a)] where that is the first predicate of the step; *:a,
-//             p:*; P/(a | b), P//(a | b), P/(@a | @b);
+//             p:*; P/(a | b), P//(a | b), P/(@a | @b), P/(parent::a | parent::b);
 //             //a | //b, /r/a | /r/b
 // Facts       the test before the filter looks at kinds of nodes alone; the names can be resolved
 //             without an error; no expression behind it asks for the position that a node has
@@ -257,7 +257,8 @@ class Search {
       if (!found || (axis != 0 && found->axis() != axis)) return false;
       axis = found->axis();
       names.addTest(By::Test, testOf(*found));
-      return axis == XQueryAxisChild || axis == XQueryAxisAttribute;
+      return axis == XQueryAxisChild || axis == XQueryAxisAttribute || axis == XQueryAxisParent ||
+             axis == XQueryAxisSelf;
     };
     if (!forEachOperand(_planning.program[place].expr, isUnion, add)) return;
     if (!XQueryHidesFocusOf(*step.step, walk, path, _planning)) return refuse(place);
