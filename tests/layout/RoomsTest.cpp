@@ -45,8 +45,8 @@ constexpr std::array<std::string_view, 2> narrowHeaders = {
 };
 
 // The libraries behind the platform, by how their headers are named.
-constexpr std::array<std::string_view, 8> libraryHeaders = {
-    "libxml/", "libxslt/", "libexslt/", "unicode/", "curl/", "pcre2", "gmp", "tidy",
+constexpr std::array<std::string_view, 9> libraryHeaders = {
+    "libxml/", "libxslt/", "libexslt/", "unicode/", "curl/", "pcre2", "gmp", "tidy", "hwy/",
 };
 
 struct Include {
