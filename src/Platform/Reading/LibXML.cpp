@@ -37,7 +37,7 @@ namespace {
 // encodings and of buffers. All of them arrive at the thread's parse.
 class Parse {
  public:
-  Parse(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error)
+  Parse(const TextInput& read, LibXMLHandler& handler, NSXMLParseError& error)
       : _read(read), _handler(handler), _error(error) {}
   bool run();
 
@@ -97,7 +97,7 @@ class Parse {
   static void hearText(void*, const char* format, ...);
   void hear(const xmlError& error);
 
-  const LibXMLReader& _read;
+  const TextInput& _read;
   LibXMLHandler& _handler;
   NSXMLParseError& _error;
   xmlParserCtxt* _parser = nullptr;
@@ -582,7 +582,7 @@ bool Parse::run() {
 
 }  // namespace
 
-bool parseWithLibXML(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error) {
+bool parseWithLibXML(const TextInput& read, LibXMLHandler& handler, NSXMLParseError& error) {
   LibXMLMemory::begin();
   return Parse(read, handler, error).run();
 }

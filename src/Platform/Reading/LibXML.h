@@ -6,6 +6,7 @@
 // bounded by memory only.
 #pragma once
 
+#include "Platform/Reading/TextSource.h"
 #include "xquery/XMLNode.h"
 
 #include <cstddef>
@@ -74,9 +75,6 @@ struct LibXMLStop {
   const char* message;
 };
 
-// Fills the buffer; answers the number of bytes, 0 at the end of the input, negative on failure.
-using LibXMLReader = std::function<ptrdiff_t(char* buffer, size_t size)>;
-
 // What entities and attribute defaults add to a document is at most the larger of these: an
 // absolute number of bytes, and a multiple of the bytes read so far. A reference counts for the
 // text of its entity and a little more, so that empty entities are bounded too; a default counts
@@ -109,6 +107,6 @@ constexpr size_t LibXMLStackBytes = size_t{2} << 20;
 
 // Whether the document was well formed; else `error` says what is wrong, and where. Needs a stack
 // of LibXMLStackBytes.
-bool parseWithLibXML(const LibXMLReader& read, LibXMLHandler& handler, NSXMLParseError& error);
+bool parseWithLibXML(const TextInput& input, LibXMLHandler& handler, NSXMLParseError& error);
 
 }  // namespace xquery

@@ -1,7 +1,9 @@
 #include "Platform/Tree/TreeBuilder.h"
 
 #include "Platform/Base/LastingObjects.h"
+#include "Platform/Text/Blocks.h"
 
+#include <cstring>
 #include <new>
 
 namespace xquery {
@@ -76,6 +78,19 @@ NSXMLNode* NSXMLTreeBuilder::addLeaf(Kind kind, const NSXMLName* name) {
   if (name) NSXMLTree::setAdoptedName(leaf, name);
   append(leaf);
   return leaf;
+}
+
+NSStringView NSXMLTreeBuilder::addText(NSStringView text) {
+  return withUnitsOf(text, [this](auto units) -> NSStringView {
+    using Unit = typename decltype(units)::value_type;
+    auto* const copy = static_cast<Unit*>(_tree->allocateText(units.size() * sizeof(Unit)));
+    auto* to = copy;
+    inBlocks(units, [&to](auto block) {
+      if (!block.empty()) std::memcpy(to, block.data(), block.size() * sizeof(Unit));
+      to += block.size();
+    });
+    return {copy, static_cast<uint32_t>(units.size())};
+  });
 }
 
 void NSXMLTreeBuilder::close() {

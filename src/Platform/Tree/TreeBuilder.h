@@ -23,6 +23,8 @@ class NSXMLTreeBuilder {
   // Namespaces and then attributes, before the element's children.
   NSXMLNode* addProperty(Kind kind, const NSXMLName* name);
   NSXMLNode* addLeaf(Kind kind, const NSXMLName* name = nullptr);
+  // A copy of the text in the tree, in the width that it has, for `setStoredText`.
+  NSStringView addText(NSStringView text);
   void close();
 
   // The open element or document; null before the first and after the last.

@@ -136,7 +136,7 @@ TEST(XMLDeclarations, TheyMayBeCutAnywhere) {
 template <class Fail>
 void readUpTo(const std::string& text, size_t place, Fail fail) {
   size_t at = 0;
-  const LibXMLReader read = [&](char* buffer, size_t size) -> ptrdiff_t {
+  const TextInput read = [&](char* buffer, size_t size) -> ptrdiff_t {
     if (at == place) return fail();
     const size_t count = std::min(size, place - at);
     text.copy(buffer, count, at);
@@ -218,7 +218,7 @@ class EndAtComment final : public IgnorantHandler {
 
 size_t requestsUntilComment(const std::string& text, bool isEvaluationEnded) {
   size_t at = 0;
-  const LibXMLReader read = [&](char* buffer, size_t size) {
+  const TextInput read = [&](char* buffer, size_t size) {
     const size_t count = text.copy(buffer, size, at);
     at += count;
     return static_cast<ptrdiff_t>(count);

@@ -1,0 +1,250 @@
+#include "Platform/Reading/ReadNames.h"
+
+#include "Platform/Base/KeyedHash.h"
+#include "Platform/Reading/NotTaken.h"
+#include "Platform/Reading/XMLCharacters.h"
+#include "Platform/Text/UTF8.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/ReservedNamespaces.h"
+
+#include <bit>
+
+namespace xquery {
+
+namespace {
+
+static_assert(std::endian::native == std::endian::little, "the first byte is the lowest");
+
+constexpr size_t headBytes = 2 * sizeof(uint64_t);
+
+// The first bytes of a name, and zeros behind it.
+struct Head {
+  Head(const char* begin, size_t length, const char* textEnd) {
+    if (static_cast<size_t>(textEnd - begin) >= headBytes) [[likely]] {
+      std::memcpy(words, begin, headBytes);
+      if (length < headBytes) cut(length);
+    } else if (length) {
+      std::memcpy(words, begin, std::min(length, headBytes));
+    }
+  }
+  bool operator==(const uint64_t (&other)[2]) const {
+    return words[0] == other[0] && words[1] == other[1];
+  }
+
+  uint64_t words[2] = {};
+
+ private:
+  void cut(size_t length) {
+    constexpr size_t half = sizeof(uint64_t);
+    const uint64_t kept = (uint64_t{1} << (length % half * 8)) - 1;
+    if (length < half) {
+      words[0] &= kept;
+      words[1] = 0;
+    } else {
+      words[1] &= kept;
+    }
+  }
+};
+
+uint64_t hashOf(std::string_view bytes, const Head& head) {
+  const HashSecrets& secrets = hashSecrets();
+  uint64_t hash = mixedHash(secrets, secrets.start ^ bytes.size(), head.words[0], head.words[1]);
+  while (bytes.size() > headBytes) {
+    bytes.remove_prefix(headBytes);
+    const Head next(bytes.data(), bytes.size(), bytes.data() + bytes.size());
+    hash = mixedHash(secrets, hash, next.words[0], next.words[1]);
+  }
+  return hash;
+}
+
+uint64_t hashOf(std::string_view bytes) {
+  return hashOf(bytes, Head(bytes.data(), bytes.size(), bytes.data() + bytes.size()));
+}
+
+bool isRest(const ReadName& name, const char* place) {
+  return name.bytes.size() <= headBytes ||
+         std::memcmp(place + headBytes, name.bytes.data() + headBytes,
+                     name.bytes.size() - headBytes) == 0;
+}
+
+// A name or URI in the form in which it is interned.
+class InternText {
+ public:
+  explicit InternText(std::string_view bytes) : _bytes(bytes) {
+    if (isASCII(bytes)) return;
+    _units.resize(bytes.size());
+    char16_t* const end = widenXML(bytes, _units.data());
+    take(end != nullptr);
+    _units.resize(static_cast<size_t>(end - _units.data()));
+  }
+  NSStringView view() const {
+    if (_units.empty()) return NSStringView::ascii(_bytes);
+    return {_units.data(), static_cast<uint32_t>(_units.size())};
+  }
+
+ private:
+  std::string_view _bytes;
+  std::u16string _units;
+};
+
+}  // namespace
+
+ReadNames::ReadNames(NSXMLTree& tree) : _tree(tree), _noPrefix(prefixOf({})) {
+  auto* const URI = _memory.make<ReadNamespace>();
+  URI->bytes = namespaceOfXML;
+  URI->text = NSStringView::ascii(namespaceOfXML);
+  prefixOf("xml")->bound = URI;
+}
+
+// --- names as they are written ---------------------------------------------------------------
+
+ReadName* ReadNames::find(const char* begin, const char* end, const char* textEnd) {
+  const auto length = static_cast<size_t>(end - begin);
+  take(length - 1 < longestNameTaken);
+  const Head head(begin, length, textEnd);
+  const std::string_view bytes(begin, length);
+  const uint64_t hash = hashOf(bytes, head);
+  ReadName* const found = _names.find(hash, [&](const ReadName& name) {
+    return head == name.head && name.bytes.size() == length && isRest(name, begin);
+  });
+  return found ? found : add(bytes, hash, head.words);
+}
+
+bool ReadNames::isAt(const ReadName& name, const char* place, const char* textEnd) {
+  const size_t length = name.bytes.size();
+  if (static_cast<size_t>(textEnd - place) < length) return false;
+  return Head(place, length, textEnd) == name.head && isRest(name, place);
+}
+
+ReadName* ReadNames::add(std::string_view bytes, uint64_t hash, const uint64_t (&head)[2]) {
+  const XMLNameShape shape = shapeOfXMLName(bytes);
+  take(shape.isName);
+  auto* const name = _memory.make<ReadName>();
+  name->hash = hash;
+  name->head[0] = head[0];
+  name->head[1] = head[1];
+  name->bytes = _memory.copy(bytes);
+  name->hasPrefix = shape.colon != 0;
+  name->prefix = name->hasPrefix ? prefixOf(bytes.substr(0, shape.colon)) : _noPrefix;
+  if (bytes == "xmlns") {
+    name->declares = _noPrefix;
+  } else if (bytes.starts_with("xmlns:")) {
+    name->declares = prefixOf(bytes.substr(shape.colon + 1));
+  }
+  _names.insert(name);
+  return name;
+}
+
+ReadPrefix* ReadNames::prefixOf(std::string_view bytes) {
+  const uint64_t hash = hashOf(bytes);
+  ReadPrefix* prefix =
+      _prefixes.find(hash, [=](const ReadPrefix& each) { return each.bytes == bytes; });
+  if (prefix) return prefix;
+  prefix = _memory.make<ReadPrefix>();
+  prefix->hash = hash;
+  prefix->bytes = _memory.copy(bytes);
+  _prefixes.insert(prefix);
+  return prefix;
+}
+
+// --- names as they are interned --------------------------------------------------------------
+
+const NSXMLName* ReadNames::interned(std::string_view bytes, NSStringView URI) {
+  const NSXMLName* const name = NSXMLInternName(InternText(bytes).view(), URI);
+  _tree.adopt(name);
+  return name;
+}
+
+const NSXMLName* ReadNames::elementName(ReadName& name) {
+  const ReadNamespace* const URI = name.prefix->bound;
+  if (name.element.name && name.element.URI == URI) [[likely]] {
+    return name.element.name;
+  }
+  return resolve(name, URI, name.element);
+}
+
+const NSXMLName* ReadNames::attributeName(ReadName& name) {
+  const ReadNamespace* const URI = name.hasPrefix ? name.prefix->bound : nullptr;
+  if (name.attribute.name && name.attribute.URI == URI) [[likely]] {
+    return name.attribute.name;
+  }
+  return resolve(name, URI, name.attribute);
+}
+
+const NSXMLName* ReadNames::resolve(ReadName& name, const ReadNamespace* URI,
+                                    ReadName::Interned& last) {
+  take(URI || !name.hasPrefix);  // a prefix that is not declared
+  const HashSecrets& secrets = hashSecrets();
+  const uint64_t hash = mixedHash(secrets, secrets.start, reinterpret_cast<uintptr_t>(&name),
+                                  reinterpret_cast<uintptr_t>(URI));
+  const Resolved* found = _resolved.find(
+      hash, [&](const Resolved& each) { return each.written == &name && each.URI == URI; });
+  if (!found) {
+    auto* const resolved = _memory.make<Resolved>();
+    *resolved = {hash, &name, URI, interned(name.bytes, URI ? URI->text : NSStringView())};
+    _resolved.insert(resolved);
+    found = resolved;
+  }
+  last = {URI, found->name};
+  return found->name;
+}
+
+const NSXMLName* ReadNames::target(std::string_view bytes) {
+  take(!bytes.empty() && bytes.size() <= longestNameTaken);
+  ReadName* const name =
+      find(bytes.data(), bytes.data() + bytes.size(), bytes.data() + bytes.size());
+  take(!name->hasPrefix);
+  return attributeName(*name);
+}
+
+// --- declarations ----------------------------------------------------------------------------
+
+namespace {
+
+// Others are rare or forbidden.
+bool mayBind(std::string_view prefix, std::string_view URI) {
+  if (prefix == "xml" || prefix == "xmlns") return false;
+  if (URI == namespaceOfXML || URI == namespaceOfDeclarations) return false;
+  return prefix.empty() || !URI.empty();
+}
+
+}  // namespace
+
+NSStringView ReadNames::declare(ReadPrefix& prefix, std::string_view URI, size_t depth,
+                                const std::function<NSStringView(std::string_view)>& store) {
+  take(mayBind(prefix.bytes, URI));
+  take(prefix.declaredIn != _tag);
+  prefix.declaredIn = _tag;
+  const ReadNamespace* const bound = URI.empty() ? nullptr : namespaceOf(URI, store);
+  _bindings.push_back({depth, &prefix, prefix.bound});
+  prefix.bound = bound;
+  return bound ? bound->text : NSStringView();
+}
+
+void ReadNames::unbind() {
+  const Binding& binding = _bindings.back();
+  binding.prefix->bound = binding.before;
+  _bindings.pop_back();
+}
+
+ReadNamespace* ReadNames::namespaceOf(std::string_view URI,
+                                      const std::function<NSStringView(std::string_view)>& store) {
+  take(URI.size() <= longestURITaken);
+  const uint64_t hash = hashOf(URI);
+  ReadNamespace* entry =
+      _namespaces.find(hash, [=](const ReadNamespace& each) { return each.bytes == URI; });
+  if (entry) return entry;
+  entry = _memory.make<ReadNamespace>();
+  entry->hash = hash;
+  entry->bytes = _memory.copy(URI);
+  entry->text = store(URI);
+  _namespaces.insert(entry);
+  return entry;
+}
+
+const NSXMLName* ReadNames::declarationName(ReadPrefix& prefix) {
+  if (!prefix.node) prefix.node = interned(prefix.bytes, {});
+  return prefix.node;
+}
+
+}  // namespace xquery

@@ -1,0 +1,107 @@
+// The names of a document while it is read: from the bytes of a name in a tag to the interned name
+// that it stands for at this place.
+//
+// Each name that is written has one entry, found by its bytes and checked when it is met first. The
+// entry knows its prefix, the prefix knows the namespace that it is bound to at this place, and the
+// entry keeps what the name was interned as there. So where the namespaces stay, a name is found at
+// the cost of one look into one table, however many of them are in scope; declaring one changes its
+// prefix alone, and the end of the element changes it back.
+#pragma once
+
+#include "Platform/Reading/EntryTable.h"
+#include "Platform/Tree/Names.h"
+
+#include <functional>
+
+namespace xquery {
+
+class NSXMLTree;
+
+struct ReadNamespace {
+  uint64_t hash = 0;
+  std::string_view bytes;
+  NSStringView text;  // in the tree
+};
+
+struct ReadPrefix {
+  uint64_t hash = 0;
+  std::string_view bytes;
+  const ReadNamespace* bound = nullptr;  // at this place; null for none
+  uint64_t declaredIn = 0;               // the tag
+  const NSXMLName* node = nullptr;       // the name of the nodes that declare it
+};
+
+struct ReadName {
+  struct Interned {
+    const ReadNamespace* URI = nullptr;
+    const NSXMLName* name = nullptr;
+  };
+
+  uint64_t hash = 0;
+  uint64_t head[2] = {};  // its first bytes, then zeros
+  std::string_view bytes;
+  ReadPrefix* prefix = nullptr;  // the empty one if there is none
+  bool hasPrefix = false;
+  ReadPrefix* declares = nullptr;  // as an attribute
+  Interned element;                // as what it was interned last
+  Interned attribute;
+};
+
+class ReadNames {
+ public:
+  // Names are counted by the tree.
+  explicit ReadNames(NSXMLTree& tree);
+
+  // These throw NotTaken for what is no name, or not one that can stand there.
+  //
+  // The entry of the name between the two places; nothing at `textEnd` is read.
+  ReadName* find(const char* begin, const char* end, const char* textEnd);
+  // Whether the name stands at the place, in such a text.
+  static bool isAt(const ReadName& name, const char* place, const char* textEnd);
+  const NSXMLName* elementName(ReadName& name);
+  const NSXMLName* attributeName(ReadName& name);
+  const NSXMLName* target(std::string_view bytes);  // of an instruction
+
+  // What an element declares: from here on, until `endElement` for the same depth. `store` puts the
+  // text of a new namespace into the tree. Answers that text.
+  void startTag() { ++_tag; }
+  NSStringView declare(ReadPrefix& prefix, std::string_view URI, size_t depth,
+                       const std::function<NSStringView(std::string_view)>& store);
+  void endElement(size_t depth) {
+    while (!_bindings.empty() && _bindings.back().depth == depth) unbind();
+  }
+  const NSXMLName* declarationName(ReadPrefix& prefix);
+
+ private:
+  struct Resolved {
+    uint64_t hash = 0;
+    const ReadName* written = nullptr;
+    const ReadNamespace* URI = nullptr;
+    const NSXMLName* name = nullptr;
+  };
+  struct Binding {
+    size_t depth;
+    ReadPrefix* prefix;
+    const ReadNamespace* before;
+  };
+
+  ReadName* add(std::string_view bytes, uint64_t hash, const uint64_t (&head)[2]);
+  ReadPrefix* prefixOf(std::string_view bytes);
+  ReadNamespace* namespaceOf(std::string_view URI,
+                             const std::function<NSStringView(std::string_view)>& store);
+  const NSXMLName* resolve(ReadName& name, const ReadNamespace* URI, ReadName::Interned& last);
+  const NSXMLName* interned(std::string_view bytes, NSStringView URI);
+  void unbind();
+
+  NSXMLTree& _tree;
+  EntryMemory _memory;
+  EntryTable<ReadName> _names;
+  EntryTable<ReadPrefix> _prefixes;
+  EntryTable<ReadNamespace> _namespaces;
+  EntryTable<Resolved> _resolved;
+  std::vector<Binding, ValueAllocator<Binding>> _bindings;
+  uint64_t _tag = 0;
+  ReadPrefix* const _noPrefix;
+};
+
+}  // namespace xquery

@@ -1,0 +1,162 @@
+#include "Platform/Reading/ReadTree.h"
+
+#include "Platform/Reading/LibXML.h"
+#include "Platform/Reading/XMLCharacters.h"
+#include "Platform/Text/UTF8.h"
+#include "Platform/Tree/Names.h"
+
+#include <algorithm>
+#include <limits>
+
+namespace xquery {
+
+namespace {
+
+// Longer texts are stored as they are widened, in two passes over them.
+constexpr size_t longestWidened = size_t{1} << 16;
+constexpr const char* notText = "a text is not well formed";
+
+void checkLength(size_t count) {
+  constexpr size_t most = std::numeric_limits<uint32_t>::max() - 1;
+  if (count > most) throw LibXMLStop{"a text is too long"};
+}
+
+}  // namespace
+
+ReadText::ReadText(std::string_view all) : bytes(all), isASCII(xquery::isASCII(all)) {}
+
+ReadTree::ReadTree(uint32_t options, size_t expectedBytes)
+    : _alwaysKeepsWhitespace((options & NSXMLNodePreserveWhitespace) != 0),
+      _keepsWhitespace(_alwaysKeepsWhitespace),
+      _keepsCDATA((options & NSXMLNodePreserveCDATA) != 0),
+      _builder(std::max(expectedBytes, size_t{256}), std::max(expectedBytes / 2, size_t{128})) {
+  _builder.tree().becomeOld();
+  _builder.openDocument();
+}
+
+// --- texts -----------------------------------------------------------------------------------
+
+NSStringView ReadTree::inItsWidth(const ReadText& text) {
+  if (text.isASCII) {
+    checkLength(text.bytes.size());
+    return NSStringView::ascii(text.bytes);
+  }
+  if (text.bytes.size() > longestWidened) return storedAlone(text.bytes);
+  if (_units.size() < text.bytes.size())
+    _units.resize(std::min(2 * text.bytes.size(), longestWidened));
+  const char16_t* const end = widenXML(text.bytes, _units.data());
+  if (!end) throw LibXMLStop{notText};
+  return {_units.data(), static_cast<uint32_t>(end - _units.data())};
+}
+
+NSStringView ReadTree::storedAlone(std::string_view text) {
+  const size_t count = countXMLUnits(text);
+  if (count == notXMLText) throw LibXMLStop{notText};
+  checkLength(count);
+  auto* const units =
+      static_cast<char16_t*>(_builder.tree().allocateText(count * sizeof(char16_t)));
+  widenXML(text, units);
+  return {units, static_cast<uint32_t>(count)};
+}
+
+NSStringView ReadTree::stored(const ReadText& text) {
+  const NSStringView view = inItsWidth(text);
+  const bool isStored = !text.isASCII && text.bytes.size() > longestWidened;
+  return isStored ? view : _builder.addText(view);
+}
+
+NSXMLNode* ReadTree::addTextNode(const ReadText& text) {
+  NSXMLNode* const node = _builder.addLeaf(Kind::Text);
+  NSXMLTree::setStoredText(node, stored(text));
+  return node;
+}
+
+bool ReadTree::isKept(std::string_view text) const {
+  return _keepsWhitespace || text.find_first_not_of(whiteSpaceOfXML) != std::string::npos;
+}
+
+void ReadTree::addWholeText(const ReadText& text) {
+  if (isKept(text.bytes)) addTextNode(text);
+}
+
+void ReadTree::addText(std::string_view text) {
+  appendInBlocks(_pending, text);
+}
+
+void ReadTree::addPending(bool isSection) {
+  NSXMLNode* const node = addTextNode(ReadText(_pending));
+  if (isSection) NSXMLTree::setCDATA(node);
+  // A huge text must not hold its memory a second time until the end.
+  constexpr size_t kept = size_t{1} << 20;
+  if (_pending.capacity() > kept) ValueText<char>().swap(_pending);
+  _pending.clear();
+  _pendingIsExact = false;
+}
+
+void ReadTree::flush() {
+  if (_pending.empty()) return;
+  if (_pendingIsExact || isKept(_pending)) {
+    addPending(false);
+  } else {
+    _pending.clear();
+  }
+}
+
+void ReadTree::addSection(std::string_view text) {
+  if (text.empty()) return;
+  if (_keepsCDATA) {
+    flush();
+    addText(text);
+    addPending(true);
+  } else {
+    addText(text);
+    _pendingIsExact = true;
+  }
+}
+
+// --- markup ----------------------------------------------------------------------------------
+
+void ReadTree::openElement(const NSXMLName* name) {
+  flush();
+  _builder.openElement(name);
+}
+
+void ReadTree::addNamespace(const NSXMLName* prefix, NSStringView storedURI) {
+  NSXMLTree::setStoredText(_builder.addProperty(Kind::Namespace, prefix), storedURI);
+}
+
+void ReadTree::addAttribute(const NSXMLName* name, const ReadText& value) {
+  NSXMLNode* const attribute = _builder.addProperty(Kind::Attribute, name);
+  NSXMLTree::setStoredText(attribute, stored(value));
+  if (name->prefixLength) hearSpace(name, value.bytes);
+}
+
+void ReadTree::hearSpace(const NSXMLName* name, std::string_view value) {
+  if (name->text != "xml:space" || (value != "preserve" && value != "default")) return;
+  // The option to preserve is not overruled by a document.
+  const bool keeps = value == "preserve" || _alwaysKeepsWhitespace;
+  if (keeps == _keepsWhitespace) return;
+  _spaceChanges.push_back({_builder.current(), _keepsWhitespace});
+  _keepsWhitespace = keeps;
+}
+
+void ReadTree::closeElement() {
+  flush();
+  if (!_spaceChanges.empty() && _spaceChanges.back().element == _builder.current()) {
+    _keepsWhitespace = _spaceChanges.back().keepsOutside;
+    _spaceChanges.pop_back();
+  }
+  _builder.close();
+}
+
+void ReadTree::addComment(const ReadText& text) {
+  flush();
+  NSXMLTree::setStoredText(_builder.addLeaf(Kind::Comment), stored(text));
+}
+
+void ReadTree::addInstruction(const NSXMLName* target, const ReadText& text) {
+  flush();
+  NSXMLTree::setStoredText(_builder.addLeaf(Kind::ProcessingInstruction, target), stored(text));
+}
+
+}  // namespace xquery

@@ -1,0 +1,77 @@
+// The tree of a document that is being read, whoever reads it: which texts become nodes, and how
+// they are stored.
+//
+// Text arrives in pieces and is collected until markup ends it; then it is stored in the arena,
+// 8-bit if it can be, and becomes a text node unless it is white space that is not to be kept.
+// Texts are UTF-8. What turns out to be none, or none of XML's, ends the reading: LibXMLStop, which
+// is also thrown for a text that is too long for a node.
+#pragma once
+
+#include "Platform/Text/Blocks.h"
+#include "Platform/Tree/TreeBuilder.h"
+
+#include <string_view>
+#include <vector>
+
+namespace xquery {
+
+// A text, and whether all of it is known to be ASCII, as far as its reader has looked.
+struct ReadText {
+  explicit ReadText(std::string_view all);
+  ReadText(std::string_view all, bool isNarrow) : bytes(all), isASCII(isNarrow) {}
+  std::string_view bytes;
+  bool isASCII;
+};
+
+class ReadTree {
+ public:
+  // `options` are NSXMLOptions. So many bytes are expected; there may be more.
+  ReadTree(uint32_t options, size_t expectedBytes);
+
+  NSXMLTree& tree() { return _builder.tree(); }
+  // The finished tree's root, which the caller must make a reference to.
+  [[nodiscard]] NSXMLDocument* finish() { return cast<NSXMLDocument>(_builder.finish()); }
+
+  // Names must have been adopted by the tree. Of an element, its namespaces and then its attributes
+  // follow.
+  void openElement(const NSXMLName* name);
+  void addNamespace(const NSXMLName* prefix, NSStringView storedURI);
+  void addAttribute(const NSXMLName* name, const ReadText& value);
+  void closeElement();
+  // A piece of text. The first is for one that nothing is added to any more.
+  void addWholeText(const ReadText& text);
+  void addText(std::string_view text);
+  bool hasText() const { return !_pending.empty(); }
+  void addSection(std::string_view text);
+  void addComment(const ReadText& text);
+  void addInstruction(const NSXMLName* target, const ReadText& text);
+  // For nodes to share.
+  NSStringView stored(const ReadText& text);
+
+ private:
+  // An element under which xml:space changes what is kept.
+  struct SpaceChange {
+    const NSXMLNode* element;
+    bool keepsOutside;
+  };
+
+  void flush();
+  bool isKept(std::string_view text) const;
+  NSXMLNode* addTextNode(const ReadText& text);
+  void addPending(bool isSection);
+  NSStringView storedAlone(std::string_view text);
+  // In the width in which it is stored, good until the next text.
+  NSStringView inItsWidth(const ReadText& text);
+  void hearSpace(const NSXMLName* name, std::string_view value);
+
+  bool _alwaysKeepsWhitespace;
+  bool _keepsWhitespace;  // at this place
+  bool _keepsCDATA;
+  bool _pendingIsExact = false;  // some of it came from a CDATA section: kept whatever it is
+  NSXMLTreeBuilder _builder;
+  std::vector<SpaceChange, ValueAllocator<SpaceChange>> _spaceChanges;
+  ValueText<char> _pending;  // text not yet stored
+  std::vector<char16_t, ValueAllocator<char16_t>> _units;
+};
+
+}  // namespace xquery

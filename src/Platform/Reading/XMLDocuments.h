@@ -1,0 +1,24 @@
+// The two ways from XML text to a tree, and which of them a document goes.
+#pragma once
+
+#include "Platform/Reading/TextSource.h"
+#include "xquery/XMLNode.h"
+
+namespace xquery {
+
+// The ways make equal trees; tests compare them.
+enum class XMLWay : uint8_t {
+  Either,  // our reader's, and libxml2's where that does not take the text
+  Own,     // our reader's alone: null without an error where it does not take the text
+  LibXML,  // libxml2's alone
+};
+
+// The document; null, with the error, where it is not well formed.
+[[nodiscard]] Ref<NSXMLDocument> readDocument(TextSource& source, uint32_t options,
+                                              NSXMLParseError& error, XMLWay way = XMLWay::Either);
+
+// libxml2's way.
+[[nodiscard]] Ref<NSXMLDocument> readWithLibXML(const TextInput& input, uint32_t options,
+                                                size_t expectedBytes, NSXMLParseError& error);
+
+}  // namespace xquery

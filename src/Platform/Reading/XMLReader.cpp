@@ -1,0 +1,464 @@
+// Reading is from left to right, without recursion. A function that reads a piece of a document
+// gets the place where it begins and answers the place behind it, or null where the text in hand
+// ends before the piece does: then there is no trace of the attempt but names that are known
+// already, and it is made again with more text.
+#include "Platform/Reading/XMLReader.h"
+
+#include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/AttributeSet.h"
+#include "Platform/Reading/LibXML.h"
+#include "Platform/Reading/MarkedText.h"
+#include "Platform/Reading/NotTaken.h"
+#include "Platform/Reading/ReadNames.h"
+#include "Platform/Reading/ReadTree.h"
+#include "Platform/Reading/References.h"
+#include "Platform/Reading/XMLCharacters.h"
+#include "Platform/Reading/XMLProlog.h"
+#include "Platform/Text/ASCII.h"
+#include "Platform/Text/UTF8.h"
+
+#include <algorithm>
+#include <cstring>
+#include <new>
+
+namespace xquery {
+
+namespace {
+
+constexpr std::string_view sectionStart = "<![CDATA[";
+constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
+
+// Whether the text begins with the word; where it is too short to tell, it does not.
+bool isAt(const char* at, const char* end, std::string_view word) {
+  return static_cast<size_t>(end - at) >= word.size() &&
+         std::memcmp(at, word.data(), word.size()) == 0;
+}
+
+// The first such byte, or `end`.
+const char* findByte(const char* at, const char* end, char byte) {
+  constexpr size_t bytesPerStep = size_t{1} << 16;
+  while (at < end) {
+    const size_t count = std::min(static_cast<size_t>(end - at), bytesPerStep);
+    if (const void* found = std::memchr(at, byte, count)) return static_cast<const char*>(found);
+    at += count;
+    checkWork();
+  }
+  return end;
+}
+
+class XMLReader {
+ public:
+  XMLReader(TextSource& source, uint32_t options)
+      : _source(source), _tree(options, source.expectedBytes()), _names(_tree.tree()) {}
+  NSXMLDocument* read();
+
+ private:
+  // What has been seen of a run of text or a value: whether it stands for itself.
+  struct Raw {
+    const char* begin = nullptr;
+    const char* end = nullptr;
+    uint64_t wide = 0;
+    bool isPlain = true;
+
+    std::string_view bytes() const { return {begin, static_cast<size_t>(end - begin)}; }
+  };
+  struct Attribute {
+    ReadName* name;
+    Raw value;
+    NSStringView URI;  // that it declares, in the tree
+  };
+
+  bool getMore();
+  const char* readPiece(const char* at);
+  const char* readProlog(const char* at);
+  const char* readSpaceAround(const char* at);
+  const char* readMarkup(const char* at);
+  const char* readDeclarationLike(const char* at);
+
+  const char* readText(const char* at);
+  bool isFollowedBySection(const char* at) const;
+  void addText(const Raw& text, bool isWhole);
+
+  const char* readName(const char* at);
+  const char* readStartTag(const char* at);
+  const char* readAttribute(const char* at);
+  const char* readEquals(const char* at) const;
+  const char* readValue(const char* at, char quote, Raw& value);
+  const char* skipSpace(const char* at) const;
+  void openElement(ReadName& name);
+  void closeElement();
+  void declareNamespaces();
+  void addNamespaces();
+  void addAttributes();
+  ReadText valueOf(const Raw& value);
+  const char* readEndTag(const char* at);
+
+  const char* readComment(const char* at);
+  const char* readSection(const char* at);
+  const char* readInstruction(const char* at);
+  ReadText linesOf(Raw raw);
+  ReadText textOf(std::string_view bytes, uint64_t wide) const;
+
+  TextSource& _source;
+  ReadTree _tree;
+  ReadNames _names;
+  MarkedText _text;
+  const char* _at = nullptr;
+  const char* _end = nullptr;
+  std::vector<ReadName*, ValueAllocator<ReadName*>> _open;  // the elements
+  std::vector<Attribute, ValueAllocator<Attribute>> _attributes;
+  AttributeSet _distinct;
+  ValueText<char> _scratch;
+  bool _declares = false;  // the tag that is being read
+  bool _isASCII = false;   // as declared
+  bool _hasBegun = false;
+  bool _hasType = false;
+  bool _hasRoot = false;
+};
+
+// --- the whole -------------------------------------------------------------------------------
+
+bool XMLReader::getMore() {
+  const bool isMore = _source.more(_at);
+  _at = _source.begin();
+  _end = _source.end();
+  _text.start(_at, _end);
+  return isMore;
+}
+
+NSXMLDocument* XMLReader::read() {
+  _at = _source.begin();
+  _end = _source.end();
+  _text.start(_at, _end);
+  for (;;) {
+    const char* const next = _at == _end ? nullptr : readPiece(_at);
+    if (next) {
+      _at = next;
+    } else if (!getMore() && (_hasBegun || _at == _end)) {
+      break;
+    }
+  }
+  take(_at == _end && _open.empty() && _hasRoot);
+  return _tree.finish();
+}
+
+const char* XMLReader::readPiece(const char* at) {
+  if (!_hasBegun) return readProlog(at);
+  if (*at == '<') return readMarkup(at);
+  return _open.empty() ? readSpaceAround(at) : readText(at);
+}
+
+// Before the first piece.
+const char* XMLReader::readProlog(const char* at) {
+  constexpr size_t longestStart = 9;  // the mark, "<?xml" and white space
+  const bool isShort = static_cast<size_t>(_end - at) < longestStart;
+  if (isShort && _source.isUnfinished()) return nullptr;
+  const char* next = at;
+  if (isAt(at, _end, byteOrderMark)) next += byteOrderMark.size();
+  if (isAt(next, _end, "<?xml") && next + 5 < _end && isXMLSpace(next[5])) {
+    XMLDeclaration declaration;
+    next = readXMLDeclaration(next, _end, declaration);
+    if (!next) {
+      take(_source.isUnfinished());
+      return nullptr;
+    }
+    _isASCII = declaration.isASCII;
+    take(!_isASCII || *at == '<');
+  }
+  _hasBegun = true;
+  return next;
+}
+
+const char* XMLReader::readSpaceAround(const char* at) {
+  take(isXMLSpace(*at));
+  return skipSpace(at);
+}
+
+const char* XMLReader::readMarkup(const char* at) {
+  if (at + 1 == _end) return nullptr;
+  switch (at[1]) {
+    case '/':
+      return readEndTag(at);
+    case '?':
+      return readInstruction(at);
+    case '!':
+      return readDeclarationLike(at);
+    default:
+      return readStartTag(at);
+  }
+}
+
+// What begins with "<!".
+const char* XMLReader::readDeclarationLike(const char* at) {
+  if (isAt(at, _end, "<!--")) return readComment(at);
+  if (isAt(at, _end, sectionStart)) return readSection(at);
+  if (static_cast<size_t>(_end - at) < sectionStart.size()) return nullptr;
+  take(isAt(at, _end, "<!DOCTYPE") && !_hasType && !_hasRoot);
+  const char* const next = readDocumentType(at, _end);
+  if (next) _hasType = true;
+  return next;
+}
+
+// --- text ------------------------------------------------------------------------------------
+
+ReadText XMLReader::textOf(std::string_view bytes, uint64_t wide) const {
+  take(bytes.size() <= longestPieceTaken && !(wide && _isASCII));
+  return {bytes, wide == 0};
+}
+
+const char* XMLReader::readText(const char* at) {
+  Raw text;
+  text.begin = at;
+  for (;; ++at) {
+    at = _text.textEnd(at, text.wide);
+    if (at == _end) return nullptr;
+    if (*at == '<') break;
+    if (*at == '>') {
+      take(at - text.begin < 2 || at[-1] != ']' || at[-2] != ']');
+    } else {
+      take(*at == '&' || *at == '\r');
+      text.isPlain = false;
+    }
+  }
+  if (at + 1 == _end) return nullptr;
+  text.end = at;
+  addText(text, !isFollowedBySection(at));
+  return at;
+}
+
+// Whether what follows may be more text.
+bool XMLReader::isFollowedBySection(const char* at) const {
+  return at[1] == '!';
+}
+
+void XMLReader::addText(const Raw& text, bool isWhole) {
+  ReadText known = textOf(text.bytes(), text.wide);
+  if (!text.isPlain) {
+    _scratch.clear();
+    appendTextOf(known.bytes, _scratch);
+    known = ReadText(_scratch);
+  }
+  if (isWhole && !_tree.hasText()) {
+    _tree.addWholeText(known);
+  } else {
+    _tree.addText(known.bytes);
+  }
+}
+
+// --- tags ------------------------------------------------------------------------------------
+
+const char* XMLReader::skipSpace(const char* at) const {
+  for (WorkPacer pacer; at < _end && isXMLSpace(*at); ++at) pacer.turn();
+  return at;
+}
+
+const char* XMLReader::readName(const char* at) {
+  uint64_t wide = 0;
+  const char* const end = _text.nameEnd(at, wide);
+  take(!(wide && _isASCII) && static_cast<size_t>(end - at) <= longestNameTaken);
+  return end == _end ? nullptr : end;
+}
+
+const char* XMLReader::readStartTag(const char* at) {
+  take(!_open.empty() || !_hasRoot);
+  const char* const nameBegin = at + 1;
+  at = readName(nameBegin);
+  if (!at) return nullptr;
+  ReadName* const name = _names.find(nameBegin, at, _end);
+  _attributes.clear();
+  _declares = false;
+  for (;;) {
+    const char* const next = skipSpace(at);
+    if (next == _end) return nullptr;
+    if (*next == '>') {
+      openElement(*name);
+      return next + 1;
+    }
+    if (*next == '/') {
+      if (next + 1 == _end) return nullptr;
+      take(next[1] == '>');
+      openElement(*name);
+      closeElement();
+      return next + 2;
+    }
+    take(next != at);
+    at = readAttribute(next);
+    if (!at) return nullptr;
+  }
+}
+
+const char* XMLReader::readEquals(const char* at) const {
+  at = skipSpace(at);
+  if (at == _end) return nullptr;
+  take(*at == '=');
+  at = skipSpace(at + 1);
+  return at == _end ? nullptr : at;
+}
+
+const char* XMLReader::readAttribute(const char* at) {
+  const char* const nameEnd = readName(at);
+  if (!nameEnd) return nullptr;
+  Attribute attribute = {_names.find(at, nameEnd, _end), {}, {}};
+  at = readEquals(nameEnd);
+  if (!at) return nullptr;
+  take(*at == '"' || *at == '\'');
+  at = readValue(at + 1, *at, attribute.value);
+  if (!at) return nullptr;
+  if (attribute.name->declares) _declares = true;
+  _attributes.push_back(attribute);
+  return at;
+}
+
+const char* XMLReader::readValue(const char* at, char quote, Raw& value) {
+  value.begin = at;
+  for (;; ++at) {
+    at = _text.valueEnd(at, value.wide);
+    if (at == _end) return nullptr;
+    if (*at == quote) break;
+    if (*at == '"' || *at == '\'' || *at == '>') continue;
+    take(*at == '&' || isXMLSpace(*at));
+    value.isPlain = false;
+  }
+  value.end = at;
+  return at + 1;
+}
+
+ReadText XMLReader::valueOf(const Raw& value) {
+  const ReadText known = textOf(value.bytes(), value.wide);
+  if (value.isPlain) return known;
+  _scratch.clear();
+  appendValueOf(known.bytes, _scratch);
+  return ReadText(_scratch);
+}
+
+void XMLReader::declareNamespaces() {
+  _names.startTag();
+  const auto store = [this](std::string_view URI) { return _tree.stored(ReadText(URI)); };
+  for (Attribute& attribute : _attributes) {
+    if (!attribute.name->declares) continue;
+    attribute.URI = _names.declare(*attribute.name->declares, valueOf(attribute.value).bytes,
+                                   _open.size(), store);
+  }
+}
+
+// The namespaces of a tag are in scope in all of it.
+void XMLReader::openElement(ReadName& name) {
+  if (_declares) declareNamespaces();
+  _open.push_back(&name);
+  _hasRoot = true;
+  _tree.openElement(_names.elementName(name));
+  if (_declares) addNamespaces();
+  if (!_attributes.empty()) addAttributes();
+}
+
+void XMLReader::addNamespaces() {
+  for (const Attribute& attribute : _attributes) {
+    ReadPrefix* const prefix = attribute.name->declares;
+    if (prefix) _tree.addNamespace(_names.declarationName(*prefix), attribute.URI);
+  }
+}
+
+void XMLReader::addAttributes() {
+  _distinct.start(_attributes.size());
+  for (const Attribute& attribute : _attributes) {
+    if (attribute.name->declares) continue;
+    const NSXMLName* const name = _names.attributeName(*attribute.name);
+    take(_distinct.insert(name->expanded));
+    _tree.addAttribute(name, valueOf(attribute.value));
+  }
+}
+
+void XMLReader::closeElement() {
+  _tree.closeElement();
+  _open.pop_back();
+  _names.endElement(_open.size());
+}
+
+const char* XMLReader::readEndTag(const char* at) {
+  take(!_open.empty());
+  const ReadName& name = *_open.back();
+  at += 2;
+  if (static_cast<size_t>(_end - at) <= name.bytes.size()) return nullptr;
+  take(ReadNames::isAt(name, at, _end));
+  at = skipSpace(at + name.bytes.size());
+  if (at == _end) return nullptr;
+  take(*at == '>');
+  closeElement();
+  return at + 1;
+}
+
+// --- comments, sections, instructions --------------------------------------------------------
+
+// Of what is not looked at for markup. Something that ends a run of text stands behind it.
+ReadText XMLReader::linesOf(Raw raw) {
+  for (const char* at = raw.begin; (at = _text.textEnd(at, raw.wide)) < raw.end; ++at) {
+    if (*at == '\r') raw.isPlain = false;
+    take(static_cast<unsigned char>(*at) >= ' ' || *at == '\r');
+  }
+  const ReadText known = textOf(raw.bytes(), raw.wide);
+  if (raw.isPlain) return known;
+  _scratch.clear();
+  appendLinesOf(known.bytes, _scratch);
+  return ReadText(_scratch);
+}
+
+const char* XMLReader::readComment(const char* at) {
+  const char* const begin = at + 4;
+  for (at = begin;; ++at) {
+    at = findByte(at, _end, '-');
+    if (_end - at < 3) return nullptr;
+    if (at[1] == '-') break;
+  }
+  take(at[2] == '>');
+  _tree.addComment(linesOf({begin, at}));
+  return at + 3;
+}
+
+const char* XMLReader::readSection(const char* at) {
+  take(!_open.empty());
+  const char* const begin = at + sectionStart.size();
+  for (at = begin;; ++at) {
+    at = findByte(at, _end, ']');
+    if (_end - at < 3) return nullptr;
+    if (at[1] == ']' && at[2] == '>') break;
+  }
+  _tree.addSection(linesOf({begin, at}).bytes);
+  return at + 3;
+}
+
+// Those that are spelt like the declaration of a document are reserved, but for two.
+bool isReservedTarget(std::string_view target) {
+  return lowerCase(target.substr(0, 3)) == "xml" && target != "xml-stylesheet" &&
+         target != "xml-model";
+}
+
+const char* XMLReader::readInstruction(const char* at) {
+  const char* const targetBegin = at + 2;
+  for (at = targetBegin; at < _end && *at != '?' && !isXMLSpace(*at); ++at) continue;
+  if (_end - at < 2) return nullptr;
+  const std::string_view target(targetBegin, static_cast<size_t>(at - targetBegin));
+  take(!isReservedTarget(target) && (*at != '?' || at[1] == '>'));
+  const char* const begin = skipSpace(at);
+  for (at = begin;; ++at) {
+    at = findByte(at, _end, '?');
+    if (_end - at < 2) return nullptr;
+    if (at[1] == '>') break;
+  }
+  static_cast<void>(textOf(target, !isASCII(target)));
+  _tree.addInstruction(_names.target(target), linesOf({begin, at}));
+  return at + 2;
+}
+
+}  // namespace
+
+Ref<NSXMLDocument> readXML(TextSource& source, uint32_t options) {
+  try {
+    return Ref<NSXMLDocument>(XMLReader(source, options).read());
+  } catch (const NotTaken&) {
+  } catch (const LibXMLStop&) {
+  } catch (const std::bad_alloc&) {
+  }
+  return nullptr;
+}
+
+}  // namespace xquery
