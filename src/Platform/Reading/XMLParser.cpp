@@ -90,7 +90,7 @@ Ref<NSXMLDocument> NSXMLDocument::documentWithData(std::string_view bytes, uint3
   NSXMLParseError ignored;
   if (options & NSXMLDocumentTidyHTML) return parseHTML(bytes, options, error ? *error : ignored);
   TextSource source(bytes);
-  return readDocument(source, options, error ? *error : ignored, XMLWay::LibXML);
+  return readDocument(source, options, error ? *error : ignored);
 }
 
 Ref<NSXMLDocument> NSXMLDocument::documentWithFile(const std::string& path, uint32_t options,
@@ -106,7 +106,7 @@ Ref<NSXMLDocument> NSXMLDocument::documentWithFile(const std::string& path, uint
     return parseHTML(bytes, options, reported);
   }
   TextSource source(read, file.isSeekable() ? [&] { return file.rewind(); } : TextRewinding());
-  Ref<NSXMLDocument> document = readDocument(source, options, reported, XMLWay::LibXML);
+  Ref<NSXMLDocument> document = readDocument(source, options, reported);
   if (!document && file.failure()) return unreadable(path, file.failure(), reported);
   return document;
 }
