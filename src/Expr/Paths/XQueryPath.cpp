@@ -21,16 +21,6 @@
 namespace xquery {
 namespace {
 
-bool allAreNodes(const Value& items) {
-  const XQueryItemList list(items.get());
-  WorkPacer pacer;
-  for (size_t i = 0; i < list.count(); ++i) {
-    pacer.turn();
-    if (!XQueryIsNode(list[i])) return false;
-  }
-  return true;
-}
-
 [[noreturn]] void raiseNoNode(const XQueryErrorText<>& text, XQueryContext& context) {
   context._internal().raise(text.error());
 }
@@ -275,7 +265,7 @@ Value XQueryFilterStep::valueFor(NSObject* item, int64_t position, XQueryContext
   Value value = _expr ? _expr->evaluateWithContext(context) : Value(NSNull::null());
   if (value) value = handlePreicatesFromIndex(0, std::move(value), context);
   if (XQueryHasFailed(value, context)) return {};
-  if (_next && !allAreNodes(value)) raiseNoNode(XQueryErrors::itemNotANode, context);
+  if (_next && !XQueryAllAreNodes(value)) raiseNoNode(XQueryErrors::itemNotANode, context);
   return value;
 }
 

@@ -2,6 +2,9 @@
 
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryPath.h"
+#include "Expr/XQuerySequence.h"
+#include "Platform/Base/WorkMeter.h"
+#include "Types/XQueryAtomization.h"
 
 namespace xquery {
 namespace {
@@ -14,6 +17,16 @@ constexpr uint32_t allKinds = namedKinds | XQueryKindBit(Kind::Document) |
                               XQueryKindBit(Kind::Comment) | XQueryKindBit(Kind::Text);
 
 }  // namespace
+
+bool XQueryAllAreNodes(const Value& items) {
+  const XQueryItemList list(items.get());
+  WorkPacer pacer;
+  for (size_t i = 0; i < list.count(); ++i) {
+    pacer.turn();
+    if (!XQueryIsNode(list[i])) return false;
+  }
+  return true;
+}
 
 bool XQueryPathRun::contextHasDefaultNamespace() {
   if (_defaultNamespace == DefaultNamespace::Unknown) {

@@ -14,6 +14,9 @@
 
 namespace xquery {
 
+// Whether every item of a value of any shape is a node.
+bool XQueryAllAreNodes(const Value& items);
+
 class XQueryPathRun {
  public:
   XQueryPathRun(XQueryPathResults& toResults, XQueryContext& forContext)

@@ -6,22 +6,11 @@
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Base/WorkMeter.h"
-#include "Types/XQueryAtomization.h"
 
 #include <algorithm>
 
 namespace xquery {
 namespace {
-
-bool allAreNodes(const Value& items) {
-  const XQueryItemList list(items.get());
-  WorkPacer pacer;
-  for (size_t i = 0; i < list.count(); ++i) {
-    pacer.turn();
-    if (!XQueryIsNode(list[i])) return false;
-  }
-  return true;
-}
 
 bool isKeptByAll(const XQueryStep& step, size_t firstPredicate, NSObject* item, int64_t position,
                  XQueryContext& context) {
@@ -138,7 +127,7 @@ XQueryWalkedPath::Answer XQueryWalkedPath::walk(XQueryContext& context, Value& i
   }
   if (_steps.empty() || isNull(items)) return Answer::Items;
   XQueryPathWalk walk(_steps, _trailCount, results, context);
-  walk.setsEveryFocus = !allAreNodes(items);
+  walk.setsEveryFocus = !XQueryAllAreNodes(items);
   walk.orderIsFree = dynamic.ordered();
   if (results.mayEndEarly() && !mayEndEarly(items, walk)) results.takeAll();
   if (!_picker || !pickNodes(items, walk)) walk.takeValue(0, items, true);
@@ -199,7 +188,7 @@ bool XQueryWalkedPath::listNodesBefore(const XQueryStep& step, XQueryContext& co
     if (XQueryHasFailed(start, context)) return false;
   }
   const XQueryWalkedStep* last = walked(step);
-  if (!start || !last || !allAreNodes(start)) return false;
+  if (!start || !last || !XQueryAllAreNodes(start)) return false;
   XQueryPathResults results;
   XQueryPathWalk walk(_steps, _trailCount, results, context);
   return isNull(start) || listNodes(start, *last, walk, nodes);
