@@ -315,12 +315,14 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
   static bool classof(const NSObject& object) { return object.kind() == Kind::Document; }
   [[nodiscard]] static Ref<NSXMLDocument> document();
   // Parses XML 1.0 with namespaces; null, with `error` filled when given, for input that is not
-  // well formed. External entities and DTDs are never read. What internal entities and attribute
+  // well formed. External entities and DTDs are never read. Depth and the length of texts (below
+  // 4 Gi units) are bounded by memory only. Of documents that have declarations of their own, that
+  // are neither UTF-8 nor ASCII, or that are not well formed, what internal entities and attribute
   // defaults add is bounded by the larger of 10 MiB and 20 times the input, the attributes of one
   // tag and the names in one list of a declaration by 6,000 and a little more, the attributes that
-  // are declared by 10,000, the namespaces in scope by 250,000 and fewer for large tags; depth and
-  // the length of texts (below 4 Gi units) by memory only. Without NSXMLNodePreserveWhitespace a
-  // text of white space only is dropped unless xml:space says preserve.
+  // are declared by 10,000, the namespaces in scope by 250,000 and fewer for large tags. Without
+  // NSXMLNodePreserveWhitespace a text of white space only is dropped unless xml:space says
+  // preserve.
   //
   // With NSXMLDocumentTidyHTML the bytes are HTML of any quality, in the encoding that they name.
   // What is missing is added: there is always html, head and body. Names are in lower case,
