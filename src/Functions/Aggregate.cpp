@@ -1,7 +1,6 @@
 #include "Functions/Aggregate.h"
 
 #include "Expr/Operators/XQueryArithmetic.h"
-#include "Types/XQueryNumericOperand.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryTextArgument.h"
@@ -9,6 +8,7 @@
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
+#include "Types/XQueryNumericOperand.h"
 
 #include <cmath>
 

@@ -5,8 +5,8 @@
 // since their promotion cannot fail; everything else is promoted as the rule says.
 #pragma once
 
-#include "Types/XQueryUntypedText.h"
 #include "Types/XQueryTypeTable.h"
+#include "Types/XQueryUntypedText.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 

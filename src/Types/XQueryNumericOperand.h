@@ -8,8 +8,8 @@
 // and casting them to it is what `asDouble` does, or nothing at all.
 #pragma once
 
-#include "Types/XQueryUntypedText.h"
 #include "Types/XQueryNumber.h"
+#include "Types/XQueryUntypedText.h"
 #include "xquery/Object.h"
 
 #include <cstdint>
