@@ -211,6 +211,16 @@ TEST(Join, SeveralComparisonsAnswerAsThePlainWay) {
   }
 }
 
+// A condition that reads no item may stand behind a probe that fails.
+TEST(Join, ProbesFailBeforeTheConditionsBehindThem) {
+  const Value document = parsed("<r><a x='1' k='1'/><a x='1' k='2'/><a x='2' k='3'/><b/><b/></r>");
+  const std::string query =
+      "for $o in //a[1] return for $u in (//b, 7), $z in //a"
+      " where $o/@x = $z/@x and $u/@y = $z/@k and $u = $o/@none return $z/@k/string()";
+  EXPECT_EQ(answer(query, document), plainAnswer(query, document));
+  EXPECT_EQ(answer(query, document), "error 20 line 0 context item not a node");
+}
+
 // --- what joins are and are not ------------------------------------------------------------------
 
 TEST(Join, ARoundMayBeginAnotherOneOfTheSameExpression) {

@@ -230,21 +230,23 @@ Value XQueryJoin::keyOf(const Value& item, size_t position, size_t term,
 }
 
 // Makes the questions for those tables that can be asked; false for the plain way. Without probes,
-// which is how nothing is met, what may be an error has still to be asked.
+// which is how nothing is met, what may be an error has still to be asked: the guard that does not
+// hold may stand behind it.
 bool XQueryJoin::askEach(const Tables& tables, bool withProbes, XQueryContext& context,
                          std::vector<Asked>& asked) const {
   for (size_t index = 0; index < tables.byTerm.size(); ++index) {
     const XQueryJoinTerm& term = _condition.terms[index];
     XQueryJoinTable* table = tables.byTerm[index].get();
-    if (!table && !(term.mustNotFail && withProbes)) continue;
+    if (!table && !term.mustNotFail) continue;
     if (term.outward && !isInvariantInRound(*term.outward, context)) {
       if (term.mustNotFail) return false;
       if (term.mustAnswer) break;
       continue;
     }
-    const Value probe = withProbes ? valueOrNull(*term.probe, context) : NSNull::null();
+    static const Value nothing = NSNull::null();
+    Value probe = withProbes || term.mustNotFail ? valueOrNull(*term.probe, context) : nothing;
     if (!probe && term.mustNotFail) return false;
-    auto question = table ? table->questionOf(probe) : std::nullopt;
+    auto question = table ? table->questionOf(withProbes ? probe : nothing) : std::nullopt;
     const bool answers = question && table->isRegularFor(*question);
     if (question) asked.push_back({table, std::move(*question)});
     if (term.mustAnswer && !answers) break;
