@@ -73,115 +73,148 @@ const std::vector<Work>& longWork() {
        "declare function local:fib($n) { if ($n < 2) then 1 else local:fib($n - 1) + "
        "local:fib($n - 2) }; local:fib(60)"},
       {"Sorting",
-       "for $k in 1 to 1000000 return count(for $i in 1 to 200000 order by "
+       "for $j in 1 to 1000, $k in 1 to 1000000 return count(for $i in 1 to 200000 order by "
        "($i * 7919) mod 100003 return $i)"},
-      {"SortingStrings", strings + "for $k in 1 to 1000000 return count(for $i in $s order by $i "
-                                   "descending return $i)"},
-      {"ComparingStrings", strings + "for $k in 1 to 1000000 where $s = $t return $k"},
+      {"SortingStrings",
+       strings + "for $j in 1 to 1000, $k in 1 to 1000000 return count(for $i in $s order by $i "
+                 "descending return $i)"},
+      {"ComparingStrings",
+       strings + "for $j in 1 to 1000, $k in 1 to 1000000 where $s = $t return $k"},
       {"ComparingDates",
        "let $d := for $i in 1 to 3000 return xs:date('2004-01-01') + "
-       "xdt:dayTimeDuration(concat('P', $i, 'D')) for $k in 1 to 1000000 where $d = xs:date("
+       "xdt:dayTimeDuration(concat('P', $i, 'D')) for $j in 1 to 1000, $k in 1 to 1000000 where $d "
+       "= xs:date("
        "'1999-01-01') or $d > $d return $k"},
       {"DistinctValues",
-       strings + "for $k in 1 to 1000000 return count(distinct-values(($s, $t)))"},
-      {"Adding", "for $k in 1 to 1000000 return sum(1 to 1000000)"},
+       strings + "for $j in 1 to 1000, $k in 1 to 1000000 return count(distinct-values(($s, $t)))"},
+      {"Adding", "for $j in 1 to 1000, $k in 1 to 1000000 return sum(1 to 1000000)"},
       {"Types",
-       "let $s := (1 to 1000000, 'a') for $k in 1 to 1000000 return $s instance of "
+       "let $s := (1 to 1000000, 'a') for $j in 1 to 1000, $k in 1 to 1000000 return $s instance "
+       "of "
        "xs:integer*"},
       {"Typeswitch",
-       "let $s := (1 to 1000000, 'a') for $k in 1 to 1000000 return typeswitch ($s) "
+       "let $s := (1 to 1000000, 'a') for $j in 1 to 1000, $k in 1 to 1000000 return typeswitch "
+       "($s) "
        "case xs:integer* return 1 case xs:string* return 2 default return 3"},
-      {"Text", megabytes + "for $k in 1 to 1000000 return count(concat($s, $k))"},
-      {"MappingText",
-       megabytes + "for $k in 1 to 1000000 return count((upper-case($s), translate($s, 'a9', 'b'), "
-                   "normalize-space($s), escape-uri($s, true()), contains($s, 'fe'), "
-                   "string-join(($s, $s), $s)))"},
+      {"Text", megabytes + "for $j in 1 to 1000, $k in 1 to 1000000 return count(concat($s, $k))"},
+      {"MappingText", megabytes +
+                          "for $j in 1 to 1000, $k in 1 to 1000000 return count((upper-case($s), "
+                          "translate($s, 'a9', 'b'), "
+                          "normalize-space($s), escape-uri($s, true()), contains($s, 'fe'), "
+                          "string-join(($s, $s), $s)))"},
       {"MappingWideText",
-       megabytes + "let $w := translate($s, '9', '&#233;') for $k in 1 to 1000000 return "
-                   "count((upper-case($w), lower-case($w), normalize-unicode($w, 'NFD'), "
-                   "translate($w, 'a', $w), translate('a', $w, $w), escape-uri($w, false())))"},
-      {"Codepoints", megabytes + "for $k in 1 to 1000000 return "
+       megabytes +
+           "let $w := translate($s, '9', '&#233;') for $j in 1 to 1000, $k in 1 to 1000000 return "
+           "count((upper-case($w), lower-case($w), normalize-unicode($w, 'NFD'), "
+           "translate($w, 'a', $w), translate('a', $w, $w), escape-uri($w, false())))"},
+      {"Codepoints", megabytes + "for $j in 1 to 1000, $k in 1 to 1000000 return "
                                  "count(codepoints-to-string(string-to-codepoints($s)))"},
-      {"ComparingText", megabytes + "let $t := concat($s, 'x') for $k in 1 to 1000000 where "
-                                    "concat($s, 'y') = $t return $k"},
-      {"CastingText", megabytes + "for $k in 1 to 1000000 return ($s castable as xs:integer, "
-                                  "$s castable as xs:NCName, $s castable as xs:hexBinary, "
-                                  "$s castable as xs:base64Binary, $s castable as xs:token)"},
+      {"ComparingText",
+       megabytes + "let $t := concat($s, 'x') for $j in 1 to 1000, $k in 1 to 1000000 where "
+                   "concat($s, 'y') = $t return $k"},
+      {"CastingText",
+       megabytes + "for $j in 1 to 1000, $k in 1 to 1000000 return ($s castable as xs:integer, "
+                   "$s castable as xs:NCName, $s castable as xs:hexBinary, "
+                   "$s castable as xs:base64Binary, $s castable as xs:token)"},
       {"CastingTextToURI",
        megabytes + "let $p := translate($s, '0123456789abcdef', '////////////////') "
-                   "for $k in 1 to 1000000 return ($s castable as xs:anyURI, "
+                   "for $j in 1 to 1000, $k in 1 to 1000000 return ($s castable as xs:anyURI, "
                    "$p castable as xs:anyURI, string-length(string(resolve-uri($p, "
                    "'http://h/a'))), string-length(string(resolve-uri($s, 'http://h/a'))))"},
       {"CastingDigits",
-       megabytes + "let $n := translate($s, 'abcdef', '012345') for $k in 1 to 1000000 return "
+       megabytes + "let $n := translate($s, 'abcdef', '012345') for $j in 1 to 1000, $k in 1 to "
+                   "1000000 return "
                    "(number($n), $n castable as xs:decimal, $n castable as xs:date, "
                    "concat('12:00:00.', $n) castable as xs:time, number(translate($s, "
                    "'0123456789abcdef', ' ')), concat('PT', $n, 'S') castable as xs:duration)"},
-      {"LowerCaseOfSigmas", megabytes +
-                                "let $w := translate($s, '0123456789abcdef', "
-                                "'&#931;&#931;&#931;&#931;&#931;&#931;&#931;&#931;::::::::') "
-                                "for $k in 1 to 1000000 return count(lower-case($w))"},
+      {"LowerCaseOfSigmas",
+       megabytes + "let $w := translate($s, '0123456789abcdef', "
+                   "'&#931;&#931;&#931;&#931;&#931;&#931;&#931;&#931;::::::::') "
+                   "for $j in 1 to 1000, $k in 1 to 1000000 return count(lower-case($w))"},
       {"JoiningWideText",
-       megabytes + "let $w := translate($s, '9', '&#233;') for $k in 1 to 1000000 return "
-                   "count((concat($s, $w), string-join(($s, $w, $s), $w), "
-                   "ext:string-from-node(text {$w})))"},
+       megabytes +
+           "let $w := translate($s, '9', '&#233;') for $j in 1 to 1000, $k in 1 to 1000000 return "
+           "count((concat($s, $w), string-join(($s, $w, $s), $w), "
+           "ext:string-from-node(text {$w})))"},
       {"JoiningText",
-       strings + "for $k in 1 to 1000000 return string-length(string-join($s, $t[1]))"},
-      {"SearchingText", megabytes + "for $k in 1 to 1000000 return (contains($s, 'fe'), "
-                                    "substring-before($s, 'fe'), ends-with($s, 'fe'))"},
-      {"Patterns", megabytes + "for $k in 1 to 1000000 return (matches($s, 'g'), "
+       strings +
+           "for $j in 1 to 1000, $k in 1 to 1000000 return string-length(string-join($s, $t[1]))"},
+      {"SearchingText", megabytes +
+                            "for $j in 1 to 1000, $k in 1 to 1000000 return (contains($s, 'fe'), "
+                            "substring-before($s, 'fe'), ends-with($s, 'fe'))"},
+      {"Patterns", megabytes + "for $j in 1 to 1000, $k in 1 to 1000000 return (matches($s, 'g'), "
                                "string-length(replace($s, 'a', 'b')))"},
       {"SlowPatterns", "let $s := '" + std::string(3000, 'a') +
-                           "' for $k in 1 to 1000000 return "
+                           "' for $j in 1 to 1000, $k in 1 to 1000000 return "
                            "matches($s, '(a+)+b')"},
-      {"Tokens", megabytes + "for $k in 1 to 1000000 return count(tokenize($s, 'a'))"},
-      {"DeepEqual", "for $k in 1 to 1000000 return deep-equal(/, <x>{/}</x>/node())", Input::Wide},
+      {"Tokens",
+       megabytes + "for $j in 1 to 1000, $k in 1 to 1000000 return count(tokenize($s, 'a'))"},
+      {"DeepEqual",
+       "for $j in 1 to 1000, $k in 1 to 1000000 return deep-equal(/, <x>{/}</x>/node())",
+       Input::Wide},
       {"Sequences",
-       "let $s := (1 to 1000000, 1) for $k in 1 to 1000000 return (count(reverse($s)), "
+       "let $s := (1 to 1000000, 1) for $j in 1 to 1000, $k in 1 to 1000000 return "
+       "(count(reverse($s)), "
        "count(subsequence($s, 5)), count(remove($s, 7)), count(index-of($s, 1)), "
        "count(insert-before($s, 9, $s)))"},
       {"Extremes",
-       "let $s := (1 to 1000000, 1) for $k in 1 to 1000000 return (max($s), min($s), "
+       "let $s := (1 to 1000000, 1) for $j in 1 to 1000, $k in 1 to 1000000 return (max($s), "
+       "min($s), "
        "avg($s))"},
-      {"Joins", strings +
-                    "for $k in 1 to 1000000 return count(for $a in $s, $b in $t where $a = $b "
-                    "return 1)"},
-      {"Rounding", digits + "for $k in 1 to 1000000 return count(round($n div 7))"},
-      {"Multiplying", digits + "for $k in 1 to 1000000 return count($n * $n)"},
-      {"Dividing", digits + "for $k in 1 to 1000000 return count(($n * $n) idiv $n)"},
-      {"Digits", digits + "for $k in 1 to 1000000 return count(xs:decimal(string($n)))"},
-      {"ComparingDigits", digits + "let $m := ($n + 1, $n + 0.1, $n - 0.01), $d := (1e5, $n) "
-                                   "for $k in 1 to 1000000 where $m = $d or $m < 1e5 return $k"},
-      {"SortingDigits", digits + "for $k in 1 to 1000000 return count(for $i in (1 to 20) order "
-                                 "by $n + $i * 0.001 return $i)"},
-      {"SearchingDigits",
-       digits + "let $m := for $i in 1 to 50 return $n + $i * 0.01 for $k in 1 to 1000000 return "
-                "(count(index-of($m, 1.5e0)), count(distinct-values(($m, 1e0))))"},
+      {"Joins", strings + "for $j in 1 to 1000, $k in 1 to 1000000 return count(for $a in $s, $b "
+                          "in $t where $a = $b "
+                          "return 1)"},
+      {"Rounding",
+       digits + "for $j in 1 to 1000, $k in 1 to 1000000 return count(round($n div 7))"},
+      {"Multiplying", digits + "for $j in 1 to 1000, $k in 1 to 1000000 return count($n * $n)"},
+      {"Dividing",
+       digits + "for $j in 1 to 1000, $k in 1 to 1000000 return count(($n * $n) idiv $n)"},
+      {"Digits",
+       digits + "for $j in 1 to 1000, $k in 1 to 1000000 return count(xs:decimal(string($n)))"},
+      {"ComparingDigits",
+       digits + "let $m := ($n + 1, $n + 0.1, $n - 0.01), $d := (1e5, $n) "
+                "for $j in 1 to 1000, $k in 1 to 1000000 where $m = $d or $m < 1e5 return $k"},
+      {"SortingDigits",
+       digits + "for $j in 1 to 1000, $k in 1 to 1000000 return count(for $i in (1 to 20) order "
+                "by $n + $i * 0.001 return $i)"},
+      {"SearchingDigits", digits +
+                              "let $m := for $i in 1 to 50 return $n + $i * 0.01 for $j in 1 to "
+                              "1000, $k in 1 to 1000000 return "
+                              "(count(index-of($m, 1.5e0)), count(distinct-values(($m, 1e0))))"},
       {"Elements",
-       "for $k in 1 to 1000000 return count(<a>{for $i in 1 to 100000 return "
+       "for $j in 1 to 1000, $k in 1 to 1000000 return count(<a>{for $i in 1 to 100000 return "
        "<b c='{$i}'>{$i}</b>}</a>)"},
-      {"WideTree", "for $k in 1 to 1000000 return count(//missing)", Input::Wide},
-      {"EveryNode", "for $k in 1 to 1000000 return count(//node())", Input::Wide},
+      {"WideTree", "for $j in 1 to 1000, $k in 1 to 1000000 return count(//missing)", Input::Wide},
+      {"EveryNode", "for $j in 1 to 1000, $k in 1 to 1000000 return count(//node())", Input::Wide},
       {"Siblings", "count(//e[count(following-sibling::e) < 0])", Input::Wide},
       {"Preceding", "count(//e[preceding::missing])", Input::Wide},
       {"PrecedingByPosition", "count(//e[preceding::e[100000]])", Input::Wide},
       {"Quadratic", "count(//a//b[.//b = //missing or count(ancestor::a) < 0])", Input::Nested},
       {"DescendantsOfAll", "count(//a[count(.//b) < 0])", Input::Nested},
       {"Ancestors", "count(//e[count(ancestor::e) < 0])", Input::Deep},
-      {"Sets", "for $k in 1 to 1000000 return count((//e union //a) intersect (//e except //b))",
+      {"Sets",
+       "for $j in 1 to 1000, $k in 1 to 1000000 return count((//e union //a) intersect (//e except "
+       "//b))",
        Input::Wide},
-      {"SetsOfParts", "let $s := (//e, //e) for $k in 1 to 1000000 return count($s | $s)",
+      {"SetsOfParts",
+       "let $s := (//e, //e) for $j in 1 to 1000, $k in 1 to 1000000 return count($s | $s)",
        Input::Wide},
-      {"Copying", "for $k in 1 to 1000000 return count(<x>{/}</x>)", Input::Wide},
-      {"CopyingDeep", "for $k in 1 to 1000000 return count(<x>{/}</x>)", Input::Deep},
-      {"Atomizing", "for $k in 1 to 1000000 return count(data(/))", Input::Wide},
-      {"AtomizingEach", "for $k in 1 to 1000000 return count(data(//e))", Input::Wide},
-      {"ComparingNodes", "for $k in 1 to 1000000 where //e = 'missing' return $k", Input::Wide},
-      {"Names", "for $k in 1 to 1000000 for $e in //e return in-scope-prefixes($e)", Input::Deep},
-      {"BaseURIs", "for $k in 1 to 1000000 for $e in //e return base-uri($e)", Input::Deep},
+      {"Copying", "for $j in 1 to 1000, $k in 1 to 1000000 return count(<x>{/}</x>)", Input::Wide},
+      {"CopyingDeep", "for $j in 1 to 1000, $k in 1 to 1000000 return count(<x>{/}</x>)",
+       Input::Deep},
+      {"Atomizing", "for $j in 1 to 1000, $k in 1 to 1000000 return count(data(/))", Input::Wide},
+      {"AtomizingEach", "for $j in 1 to 1000, $k in 1 to 1000000 return count(data(//e))",
+       Input::Wide},
+      {"ComparingNodes", "for $j in 1 to 1000, $k in 1 to 1000000 where //e = 'missing' return $k",
+       Input::Wide},
+      {"Names",
+       "for $j in 1 to 1000, $k in 1 to 1000000 for $e in //e return in-scope-prefixes($e)",
+       Input::Deep},
+      {"BaseURIs", "for $j in 1 to 1000, $k in 1 to 1000000 for $e in //e return base-uri($e)",
+       Input::Deep},
       {"RecordedBaseURIs",
        "declare base-uri 'http://b/'; let $t := <t>{for $i in 1 to 100000 return <e/>}</t> "
-       "for $k in 1 to 1000000 for $e in reverse($t/e) return base-uri($e)"},
+       "for $j in 1 to 1000, $k in 1 to 1000000 for $e in reverse($t/e) return base-uri($e)"},
   };
   return rows;
 }
