@@ -10,9 +10,9 @@ pkg_check_modules(GMP REQUIRED IMPORTED_TARGET gmp)
 pkg_check_modules(CURL REQUIRED IMPORTED_TARGET libcurl)
 pkg_check_modules(TIDY REQUIRED IMPORTED_TARGET tidy)
 pkg_check_modules(PCRE2 REQUIRED IMPORTED_TARGET libpcre2-8)
-pkg_check_modules(HWY REQUIRED libhwy)
+pkg_check_modules(HWY REQUIRED libhwy)  # its headers only
 
 add_library(xquery_dependencies INTERFACE)
 target_link_libraries(xquery_dependencies INTERFACE
   LibXml2::LibXml2 PkgConfig::XSLT ICU::i18n ICU::uc PkgConfig::GMP PkgConfig::PCRE2
-  PkgConfig::CURL PkgConfig::TIDY ${HWY_LINK_LIBRARIES} Threads::Threads)
+  PkgConfig::CURL PkgConfig::TIDY Threads::Threads)

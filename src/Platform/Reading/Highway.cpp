@@ -1,9 +1,13 @@
 // Highway, as the source of vector instructions: this file is compiled once for every kind of
-// processor, and the first call chooses among them. Its headers are included here only.
+// processor, and the first call chooses among them. Its headers are included here only. Its library
+// is not linked, and the choice is our own: loading that library takes longer than the command does
+// to start.
 #include "Platform/Reading/ByteMarks.h"
 
 #include <cstring>
 
+// Half of the vectors' width is enough: what is marked is read a byte at a time.
+#define HWY_DISABLED_TARGETS (HWY_AVX3 | HWY_AVX3_DL)
 #undef HWY_TARGET_INCLUDE
 #define HWY_TARGET_INCLUDE "Platform/Reading/Highway.cpp"
 #include <hwy/foreach_target.h>
@@ -64,11 +68,35 @@ HWY_AFTER_NAMESPACE();
 
 #if HWY_ONCE
 namespace xquery {
+namespace {
 
-HWY_EXPORT(markByVectors);
+using Marking = void (*)(const char* bytes, size_t count, ByteMarks* marks);
+
+// The best that the processor has, or what is compiled for all of them.
+Marking bestMarking() {
+#if HWY_ARCH_X86 && (HWY_TARGETS & HWY_AVX2)
+  if (__builtin_cpu_supports("avx2") && __builtin_cpu_supports("fma") &&
+      __builtin_cpu_supports("bmi") && __builtin_cpu_supports("bmi2")) {
+    return N_AVX2::markByVectors;
+  }
+#endif
+#if HWY_ARCH_X86 && (HWY_TARGETS & HWY_SSE4)
+  if (__builtin_cpu_supports("sse4.2") && __builtin_cpu_supports("aes") &&
+      __builtin_cpu_supports("pclmul")) {
+    return N_SSE4::markByVectors;
+  }
+#endif
+#if HWY_ARCH_X86 && (HWY_TARGETS & HWY_SSSE3)
+  if (__builtin_cpu_supports("ssse3")) return N_SSSE3::markByVectors;
+#endif
+  return HWY_STATIC_DISPATCH(markByVectors);
+}
+
+}  // namespace
 
 void markBytes(const char* bytes, size_t count, ByteMarks* marks) {
-  HWY_DYNAMIC_DISPATCH(markByVectors)(bytes, count, marks);
+  static const Marking best = bestMarking();
+  best(bytes, count, marks);
 }
 
 }  // namespace xquery
