@@ -4,6 +4,7 @@
 
 #include "Context/KeptValues.h"
 #include "Context/XQueryFrame.h"
+#include "Platform/Base/NSLog.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryNamespaceStack.h"
 #include "Types/XQueryBaseURIs.h"
@@ -151,6 +152,11 @@ class XQueryContextInternal {
   std::shared_ptr<XQueryClient> client() const { return _client; }
   void setClient(std::shared_ptr<XQueryClient> client) { _client = std::move(client); }
 
+  // Whether diagnostics show every error, as the environment said when the evaluation began. Asking
+  // the environment takes longer than many an expression does.
+  bool showsErrors() const { return _showsErrors; }
+  void askForDiagnostics() { _showsErrors = XQueryLogEnabled(); }
+
   // What expressions keep for their next evaluation within this one of the query.
   XQueryKeptValues& keptValues() { return _keptValues; }
   // This and all else that is kept for the rest of an evaluation.
@@ -195,6 +201,7 @@ class XQueryContextInternal {
   int64_t _position = 0;
   int64_t _last = 0;
   bool _ordered = true;
+  bool _showsErrors = XQueryLogEnabled();
   Failure _failure = Failure::None;
 };
 

@@ -235,6 +235,7 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   context._clearGlobals();
   context.clearKept();
   context.forgetManyFailures();
+  context.askForDiagnostics();
   if (contextItem && !isNull(contextItem)) context.setContextItem(contextItem, 1);
   XQueryProlog& prolog = *compiled.prolog();
   context.setOrdered(prolog.ordered());

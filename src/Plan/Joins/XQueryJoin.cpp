@@ -3,7 +3,6 @@
 #include "Context/KeptValues.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/Base/NSLog.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "xquery/Number.h"
@@ -114,7 +113,7 @@ std::unique_ptr<const XQueryJoin> XQueryJoin::ofStep(const XQueryExpr& owner,
 
 bool XQueryJoin::pick(const Value& source, const Lister& listItems, XQueryContext& context,
                       XQueryPicks& picks) const {
-  if (!source || XQueryLogEnabled()) return false;
+  if (!source || context._internal().showsErrors()) return false;
   if (_varID != 0 && XQueryItemList(source.get()).count() < XQueryJoinTable::fewestItems) {
     return false;
   }

@@ -7,7 +7,6 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Joins/XQueryJoinTable.h"
-#include "Platform/Base/NSLog.h"
 #include "Types/XQueryItemKinds.h"
 #include "xquery/Number.h"
 
@@ -116,7 +115,7 @@ std::optional<bool> XQueryEarlierItems::answer(const Value& value, XQueryContext
 }
 
 Value XQueryEarlierItems::computeValue(XQueryContext& context) const {
-  if (XQueryLogEnabled()) return plain().evaluateWithContext(context);
+  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
   const Value value = _operands.value->evaluateWithContext(context);
   if (XQueryHasFailed(value, context)) return {};
   const auto isMet = answer(value, context);

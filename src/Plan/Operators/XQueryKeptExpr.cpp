@@ -12,7 +12,6 @@
 #include "Plan/Operators/XQueryKeptExpr.h"
 
 #include "Context/XQueryContextInternal.h"
-#include "Platform/Base/NSLog.h"
 #include "xquery/Collection.h"
 #include "xquery/Number.h"
 #include "xquery/XMLNode.h"
@@ -173,7 +172,7 @@ Ref<XQueryKeptExpr> XQueryKeptExpr::exprWithPlain(Ref<XQueryExpr> plain, const X
 Value XQueryKeptExpr::computeValue(XQueryContext& context) const {
   auto& dynamic = context._internal();
   auto& keptValues = dynamic.keptValues();
-  if (keptValues.looksAway(*this) || XQueryLogEnabled()) {
+  if (keptValues.looksAway(*this) || context._internal().showsErrors()) {
     return plain().evaluateWithContext(context);
   }
   const Dependencies dependencies(_facts, dynamic);

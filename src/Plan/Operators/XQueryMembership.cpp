@@ -11,7 +11,6 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/IdentitySet.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/Base/NSLog.h"
 #include "Types/XQueryNumber.h"
 #include "xquery/Collection.h"
 #include "xquery/Number.h"
@@ -63,7 +62,7 @@ std::shared_ptr<const XQueryMembership::Members> XQueryMembership::membersOf(
 
 Value XQueryMembership::computeValue(XQueryContext& context) const {
   // Diagnostics show each error once.
-  if (XQueryLogEnabled()) return plain().evaluateWithContext(context);
+  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
   Value node;
   if (!_operands.isSetFirst) {
     node = normalised(_operands.node->evaluateWithContext(context));

@@ -1,6 +1,6 @@
 #include "Plan/Operators/XQueryPathCount.h"
 
-#include "Platform/Base/NSLog.h"
+#include "Context/XQueryContextInternal.h"
 #include "Types/XQueryNumber.h"
 #include "xquery/Number.h"
 
@@ -24,7 +24,7 @@ std::optional<bool> XQueryPathCount::holdsFor(NSXMLNode* node, const XQueryConte
 
 Value XQueryPathCount::computeValue(XQueryContext& context) const {
   // Diagnostics show every error that a predicate meets.
-  if (XQueryLogEnabled()) return plain().evaluateWithContext(context);
+  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
   const uint64_t least = _question.least;
   const auto count = countUpTo(least == 0 ? UINT64_MAX : least, context);
   if (!count) return {};

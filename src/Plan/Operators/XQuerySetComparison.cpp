@@ -7,7 +7,6 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/Base/NSLog.h"
 #include "xquery/Number.h"
 
 #include <array>
@@ -48,7 +47,8 @@ Value XQuerySetComparison::computeValue(XQueryContext& context) const {
   const size_t leftCount = XQueryItemList(left.get()).count();
   const size_t rightCount = XQueryItemList(right.get()).count();
   const size_t pairs = leftCount * rightCount;
-  if (pairs <= fewPairs || XQueryLogEnabled()) return _comparison.answerFor(left, right, context);
+  if (pairs <= fewPairs || context._internal().showsErrors())
+    return _comparison.answerFor(left, right, context);
   const bool setIsLeft = leftCount > rightCount;
   const auto set = setOf(setIsLeft ? left : right, setIsLeft, pairs >= manyPairs, context);
   const auto areMet = set ? set->meets(setIsLeft ? right : left) : std::nullopt;

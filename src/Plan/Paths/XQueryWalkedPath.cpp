@@ -4,7 +4,6 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryPathResults.h"
 #include "Expr/XQuerySequence.h"
-#include "Platform/Base/NSLog.h"
 #include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
@@ -52,12 +51,12 @@ const XQueryWalkedStep* XQueryWalkedPath::walked(const XQueryStep& asWritten) co
 }
 
 // Diagnostics show every error that a predicate meets.
-bool XQueryWalkedPath::showsErrors() const {
-  return _hasPredicates && XQueryLogEnabled();
+bool XQueryWalkedPath::showsErrors(const XQueryContext& context) const {
+  return _hasPredicates && context._internal().showsErrors();
 }
 
 Value XQueryWalkedPath::computeValue(XQueryContext& context) const {
-  if (showsErrors()) return plain().evaluateWithContext(context);
+  if (showsErrors(context)) return plain().evaluateWithContext(context);
   XQueryCheckStack(context);
   XQueryPathResults results;
   Value items;

@@ -90,7 +90,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
                  std::vector<Value>& listed) const;
   bool pickItems(Value& items, XQueryContext& context) const;
   bool pickNodes(const Value& start, XQueryPathWalk& walk) const;
-  bool showsErrors() const;
+  bool showsErrors(const XQueryContext& context) const;
 
   const Ref<XQueryPathExpr> _path;
   const XQueryStep* _start = nullptr;
