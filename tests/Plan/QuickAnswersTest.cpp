@@ -6,6 +6,7 @@
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Operators/XQueryQuickArithmetic.h"
 #include "Plan/Operators/XQueryQuickComparison.h"
+#include "Plan/PlanTesting.h"
 #include "Types/XQueryAtomization.h"
 
 #include <gtest/gtest.h>
@@ -291,6 +292,16 @@ TEST(QuickAnswer, OfAGeneralComparisonOfManyItemsIsThatOfTheOperator) {
     const Value a = sequence(generate.items(1 + generate.below(30)));
     comparesAlike(code, a, sequence(generate.items(1 + generate.below(30))));
   }
+}
+
+TEST(QuickAnswer, IsForArithmeticAndComparisonsOfValues) {
+  const auto chosen = [](std::string_view text) {
+    return plantest::choicesIn(text, [](std::string_view rule) { return rule == "operands"; });
+  };
+  EXPECT_EQ(chosen("//a/@x * 2 + 1"), 2U);
+  EXPECT_EQ(chosen("-(//a/@x)"), 1U);
+  EXPECT_EQ(chosen("(//a/@x eq 'u', sum(//a) < 2)"), 2U);
+  EXPECT_EQ(chosen("(//a is //b, //a union //b, //a and //b, 1 to count(//a))"), 0U);
 }
 
 // The bounds of a range against its integers.

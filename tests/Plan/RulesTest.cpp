@@ -665,30 +665,5 @@ TEST(Joins, FindKeysBehindCardinalityChecks) {
   }
 }
 
-TEST(AnswerQuickly, IsForArithmeticAndComparisonsOfValues) {
-  const auto chosen = [](std::string_view text) {
-    return plantest::choicesIn(text, [](std::string_view rule) { return rule == "operands"; });
-  };
-  EXPECT_EQ(chosen("//a/@x * 2 + 1"), 2U);
-  EXPECT_EQ(chosen("-(//a/@x)"), 1U);
-  EXPECT_EQ(chosen("(//a/@x eq 'u', sum(//a) < 2)"), 2U);
-  EXPECT_EQ(chosen("(//a is //b, //a union //b, //a and //b, 1 to count(//a))"), 0U);
-}
-
-TEST(BuildInPlace, IsForWhatIsHandedOnToTheContentOfOtherNodes) {
-  const auto chosen = [](std::string_view text) {
-    return plantest::choicesIn(text, [](std::string_view rule) { return rule == "constructors"; });
-  };
-  EXPECT_EQ(chosen("<a><b/>{element c {attribute d {1}}}</a>"), 3U);
-  EXPECT_EQ(chosen("document {for $i in //a return if ($i/@x) then <b/> else (1, <c/>)}"), 2U);
-  EXPECT_EQ(chosen("<a>{typeswitch (.) case element() return <b/> default return <c/>}</a>"), 2U);
-  // Others may get to know these before they are where they belong.
-  EXPECT_EQ(chosen("<a/>"), 0U);
-  EXPECT_EQ(chosen("<a>{let $b := <b/> return ($b, $b/..)}</a>"), 0U);
-  EXPECT_EQ(chosen("<a>{<b/>/c, (<b/>)[1], count(<b/>), <b/> | <c/>}</a>"), 0U);
-  EXPECT_EQ(chosen("<a x='{<b/>}'>{attribute y {<c/>}, text {<d/>}}</a>"), 1U);
-  EXPECT_EQ(chosen("declare function local:f() {<b/>}; <a>{local:f()}</a>"), 0U);
-}
-
 }  // namespace
 }  // namespace xquery

@@ -93,7 +93,9 @@ void XQueryContent::flushText() {
 }
 
 Ref<NSXMLNode> XQueryContent::adoptable(NSXMLNode& node) const {
-  return NSXMLTree::mayMoveTo(&_parent, &node) ? Ref<NSXMLNode>(&node) : node.copy();
+  if (!NSXMLTree::mayMoveTo(&_parent, &node)) return node.copy();
+  NSXMLTree::noteTakenIn(&_parent, &node);
+  return Ref<NSXMLNode>(&node);
 }
 
 void XQueryContent::insert(NSXMLNode& child) {

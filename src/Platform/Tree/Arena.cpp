@@ -594,25 +594,31 @@ void NSXMLTree::noteChange(const NSXMLNode* parent) {
   }
 }
 
-// Their trees are to become one: if either had several roots, so has the sum. Nodes that are made
-// in place are roots of their own as long as they are being filled, but while nothing is taken into
-// them from elsewhere, nobody can ask for the order of what is in them.
-void NSXMLTree::prepareToJoin(const NSXMLNode* parent, const NSXMLNode* child) {
-  NSXMLTree* const parents = of(parent);
-  NSXMLTree* const childs = of(child);
+namespace {
+
+// Both trees are to become one: if either had several roots, so has the sum.
+void prepareToJoin(NSXMLTree* parents, NSXMLTree* childs) {
   if (parents == childs) return;
-  bool several = parents->order == SeveralRoots || childs->order == SeveralRoots;
+  const bool several =
+      parents->order == NSXMLTreeHead::SeveralRoots || childs->order == NSXMLTreeHead::SeveralRoots;
+  parents->order = childs->order = several ? NSXMLTreeHead::SeveralRoots : NSXMLTreeHead::Stale;
+}
+
+}  // namespace
+
+void NSXMLTree::noteTakenIn(const NSXMLNode* parent, const NSXMLNode* node) {
+  NSXMLTree* const parents = of(parent);
+  NSXMLTree* const others = of(node);
+  if (parents == others) return;
   const auto isInSum = [&](const NSXMLUnfinished* open) {
-    return open && (of(&open->node()) == parents || of(&open->node()) == childs);
+    return open && (of(&open->node()) == parents || of(&open->node()) == others);
   };
   const NSXMLUnfinished* const innermost = NSXMLUnfinished::innermost();
-  if (isInSum(innermost) && isInSum(innermost->around())) [[unlikely]] {
-    several = true;
-    for (auto* open = innermost; isInSum(open); open = open->around()) {
-      open->node().rootNode()->_word = staleRoot;
-    }
+  if (!isInSum(innermost) || !isInSum(innermost->around())) return;
+  parents->order = SeveralRoots;
+  for (auto* open = innermost; isInSum(open); open = open->around()) {
+    open->node().rootNode()->_word = staleRoot;
   }
-  parents->order = childs->order = several ? SeveralRoots : Stale;
 }
 
 bool NSXMLTree::isRootAbove(const NSXMLNode* node, const NSXMLNode* root) {
@@ -630,7 +636,7 @@ bool NSXMLTree::adoptChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* befor
 }
 
 void NSXMLTree::insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before) {
-  prepareToJoin(parent, child);
+  prepareToJoin(of(parent), of(child));
   merge(of(parent), of(child));
   noteChange(parent);
   child->_parent = parent;
@@ -652,7 +658,7 @@ void NSXMLTree::insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* befo
 }
 
 void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property) {
-  prepareToJoin(element, property);
+  prepareToJoin(of(element), of(property));
   merge(of(element), of(property));
   noteChange(element);
   // Namespaces before attributes, each in the order of their arrival.
@@ -669,7 +675,7 @@ void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property, NSXML
     appendProperty(element, property);
     return;
   }
-  prepareToJoin(element, property);
+  prepareToJoin(of(element), of(property));
   merge(of(element), of(property));
   noteChange(element);
   property->_parent = element;

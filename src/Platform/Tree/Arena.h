@@ -176,6 +176,10 @@ class NSXMLTree : public NSXMLTreeHead {
   static bool mayMoveTo(const NSXMLNode* parent, const NSXMLNode* node) {
     return !node->_parent && !isFixed(node) && isNew(node) && !isRootAbove(parent, node);
   }
+  // Before a constructor that makes `parent` puts such a node there. Nodes that are made in place
+  // are roots of their own as long as they are being filled, which nobody can tell before they take
+  // in a node that others know.
+  static void noteTakenIn(const NSXMLNode* parent, const NSXMLNode* node);
   // The rest leaves checks to the caller.
   // Links a parentless node, moving its tree into this one. `before` is null to append.
   static void insertChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* before);
@@ -267,7 +271,6 @@ class NSXMLTree : public NSXMLTreeHead {
   void freeBaseURIs();
   // The element and the room behind it are one block.
   NSXMLElement* makeElement(size_t roomBytes, NSXMLRoom& room);
-  static void prepareToJoin(const NSXMLNode* parent, const NSXMLNode* child);
   // Before the structure under `parent` changes.
   static void noteChange(const NSXMLNode* parent);
   // Before anything of the tree changes: what is known of it goes.
