@@ -7,7 +7,6 @@
 #include "Plan/Joins/XQueryProbesAhead.h"
 
 #include <memory>
-#include <optional>
 #include <utility>
 
 namespace xquery {
@@ -135,14 +134,12 @@ void XQueryClauseJoins::addTermsAhead(size_t later, const std::vector<XQueryPlac
                        scope.readsOf(probe) == XQueryJoinReads::Round;
     if (!picks) continue;
     outward.addDeeds(probe);
-    ofLater.terms.push_back({_planning.exprAt(sides.first),
-                             _planning.exprAt(sides.second),
-                             {},
-                             promise,
-                             false,
-                             false,
-                             looksOut(sides.first),
-                             std::nullopt});
+    XQueryJoinTerm term;
+    term.key = _planning.exprAt(sides.first);
+    term.probe = _planning.exprAt(sides.second);
+    term.promise = promise;
+    term.looksOutOfItems = looksOut(sides.first);
+    ofLater.terms.push_back(std::move(term));
   }
   if (ofLater.terms.empty()) return;
   ofLater.isWhole = true;
@@ -154,8 +151,11 @@ void XQueryClauseJoins::addTermsAhead(size_t later, const std::vector<XQueryPlac
     auto probe = XQueryProbesAhead::exprWithProbe(_planning.exprAt(sides.second), laterID,
                                                   _planning.exprAt(boundAt(later)));
     probe->setPicker(XQueryJoin::ofClause(*probe, laterID, ofLater));
-    XQueryJoinTerm term{_planning.exprAt(sides.first), probe,       {}, promise, false, false,
-                        looksOut(sides.first),         std::nullopt};
+    XQueryJoinTerm term;
+    term.key = _planning.exprAt(sides.first);
+    term.probe = probe;
+    term.promise = promise;
+    term.looksOutOfItems = looksOut(sides.first);
     outward.addDeeds(facts(sides.second));
     outward.reads.remove(laterID);
     if (outward.does(XQueryDeeds::ReadsOutside)) term.outward = outward;

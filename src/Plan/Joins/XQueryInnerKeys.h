@@ -11,8 +11,8 @@ namespace xquery {
 
 class XQueryInnerKeys : public XQueryPlannedExpr {
  public:
-  // `path` ends with the step; `key` is read from each of the nodes that
-  // the step's predicates are asked for.
+  // `path` ends with the step; `key` is read from each of the nodes that the step's predicates are
+  // asked for.
   [[nodiscard]] static Ref<XQueryInnerKeys> exprWithPath(Ref<XQueryWalkedPath> path,
                                                          const XQueryStep& step,
                                                          Ref<XQueryExpr> key) {
