@@ -20,6 +20,7 @@
 #include "Platform/Base/Abandoned.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/ObjectBlocks.h"
+#include "Platform/Base/RangeMemory.h"
 #include "Platform/Base/WorkMeter.h"
 #include "xquery/Collection.h"
 #include "xquery/Memory.h"
@@ -387,6 +388,7 @@ void giveFreeBlocks() {
     giveSet();
     changeSets();
   }
+  giveFreeRangeBlocks();
 }
 
 LastingObjects::LastingObjects() : _isOutermost(!threadState.isLasting) {
@@ -456,6 +458,7 @@ void XQueryReleaseIdleMemory() {
   } catch (const std::bad_alloc&) {
     // Not even the list of what there is; the rest can still go.
   }
+  giveIdleRangePages();
 #ifdef __GLIBC__
   ::malloc_trim(0);
 #endif
