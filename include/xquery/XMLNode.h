@@ -4,16 +4,24 @@
 // to any node keeps its whole tree alive by one counter on the tree. Names are interned: two nodes
 // have the same expanded name exactly when their `expandedName` pointers are equal.
 //
-//   offset   element           attribute, namespace   text, comment, PI   document
+//   offset   element            document           text, comment      attribute, namespace
 //    0       word: document order; kind; flags; distance from the head of the block, which names
 //            the tree
-//    8       parent            parent                 parent              (null)
-//   16       next sibling      next of the element    next sibling        (null)
-//   24       first child       text                   text                first child
-//   32       previous sibling  length of the text     previous sibling
-//   40       name              name                   length of the text
-//   48       first property                           name (PI only)      URI
-//            56 bytes          48 bytes               48 bytes, PI 56     56 bytes
+//    8       parent             (null)             parent             parent
+//   12       next sibling       (null)             next sibling       next of the element
+//   16       first child        first child        length of the text, or where the text is
+//   20       previous sibling   (null)             previous sibling   name
+//   24       name               URI                the text           the text
+//   28       first property
+//            32 bytes           32 bytes           24 bytes and the text behind them
+//
+// A processing instruction is like a text, has its name at 24 and its text always elsewhere: 32
+// bytes. Elsewhere are also long texts of trees that were read or copied, and those that were set
+// later, since strings may refer to the text behind a head as long as the tree lives.
+//
+// All nodes, and the names they have, are in one range of addresses that the process reserves, not
+// larger than `NSXMLRange` and within a multiple of that. So a link to one of them is 32 bits wide:
+// the place in the range, whose start follows from where the link itself is.
 //
 // The properties of an element are one chain: its namespaces and then its attributes. The first
 // child's previous sibling field holds the last child.
@@ -69,12 +77,6 @@ struct NSXMLTreeHead {
   uint8_t order = Fresh;
 };
 
-// The head of a piece of an arena.
-struct NSXMLBlock {
-  NSXMLTreeHead* tree;
-  uintptr_t next;  // the next block; in the low bits the block's own size class
-};
-
 // Parsing options; the bit numbers are part of the interface.
 enum NSXMLOptions : uint32_t {
   NSXMLNodeOptionsNone = 0,
@@ -93,6 +95,51 @@ struct NSXMLParseError {
   int64_t column = 0;
 };
 
+constexpr uintptr_t NSXMLRange = uintptr_t{1} << 35;
+
+// A pointer to something in the range, from a place in it; null for none.
+template <class Target>
+class NSXMLLink {
+ public:
+  constexpr NSXMLLink() = default;
+  NSXMLLink(const NSXMLLink&) = delete;  // it would be read from where the copy is
+  NSXMLLink& operator=(const NSXMLLink& other) {
+    _place = other._place;
+    return *this;
+  }
+  NSXMLLink& operator=(Target* target) {
+    _place = static_cast<uint32_t>(reinterpret_cast<uintptr_t>(target) % NSXMLRange / unit);
+    return *this;
+  }
+  Target* get() const { return _place ? target() : nullptr; }
+  operator Target*() const { return get(); }
+  Target* operator->() const { return target(); }
+  explicit operator bool() const { return _place != 0; }
+
+ private:
+  static constexpr uintptr_t unit = 8;
+
+  Target* target() const {
+    const uintptr_t start = reinterpret_cast<uintptr_t>(this) & ~(NSXMLRange - 1);
+    const uintptr_t address = start + uintptr_t{_place} * unit;
+    if (!address) __builtin_unreachable();
+    return reinterpret_cast<Target*>(address);
+  }
+
+  uint32_t _place = 0;
+};
+
+static_assert(sizeof(uintptr_t) == 8 && sizeof(NSXMLLink<void>) == 4);
+
+// The head of a piece of an arena.
+struct NSXMLBlock {
+  NSXMLTreeHead* tree;
+  NSXMLLink<NSXMLBlock> next;
+  uint32_t roomUnits;  // behind the head, in units of 8 bytes
+};
+
+static_assert(sizeof(NSXMLBlock) == 16);
+
 // A node of any kind. To walk a tree:
 //
 //   for (const NSXMLNode* node = root; node; node = node->nextNode()) ...
@@ -103,14 +150,14 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
   // --- navigation: raw pointers, valid while the tree lives; all constant time unless said -------
   NSXMLNode* parent() const { return _parent; }
   // Null for attributes and namespaces.
-  NSXMLNode* nextSibling() const { return isProperty() ? nullptr : _next; }
+  NSXMLNode* nextSibling() const { return isProperty() ? nullptr : _next.get(); }
   NSXMLNode* previousSibling() const {
-    return isProperty() || !_parent || !_previous->_next ? nullptr : _previous;
+    return isProperty() || !_parent || !_previous->_next ? nullptr : _previous.get();
   }
   // Null for anything but documents and elements.
-  NSXMLNode* firstChild() const { return isBranch() ? _firstChild : nullptr; }
+  NSXMLNode* firstChild() const { return isBranch() ? _firstChild.get() : nullptr; }
   NSXMLNode* lastChild() const {
-    return isBranch() && _firstChild ? _firstChild->_previous : nullptr;
+    return isBranch() && _firstChild ? _firstChild->_previous.get() : nullptr;
   }
   // The next node in document order (attributes and namespaces apart); null at the end of the
   // document and for attributes and namespaces.
@@ -135,9 +182,7 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
   bool hasName() const { return nodeName() != nullptr; }
   const NSXMLName* nodeName() const;  // null for unnamed kinds
   // Elements and attributes only, else null.
-  const NSXMLExpandedName* expandedName() const {
-    return kind() == Kind::Element || kind() == Kind::Attribute ? _name->expanded : nullptr;
-  }
+  const NSXMLExpandedName* expandedName() const;
   // As strings; null when there is none. A namespace node's name is its prefix ("" for the default
   // namespace), a processing instruction's its target.
   Ref<NSString> name() const;
@@ -220,38 +265,33 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
  protected:
   // Bits of `_flags`.
   enum Flag : uint8_t {
-    WideText = 1,  // the node's own text is UTF-16
-    CDATA = 2,     // a text written as a CDATA section
-    Fixed = 4,     // part of a compiled query: does not move into another tree
-    BaseURI = 8,   // the tree has a base URI on record for the node
+    WideText = 1,    // the text behind the head is UTF-16
+    CDATA = 2,       // a text written as a CDATA section
+    Fixed = 4,       // part of a compiled query: does not move into another tree
+    BaseURI = 8,     // the tree has a base URI on record for the node
+    TextApart = 16,  // the text is elsewhere
   };
 
   explicit NSXMLNode(Kind kind) : NSObject(kind) {}
 
   bool isBranch() const { return kind() <= Kind::Element; }
   bool isProperty() const { return kind() == Kind::Attribute || kind() == Kind::Namespace; }
-  uint32_t textLength() const {
-    return isProperty() ? _propertyTextLength : isBranch() ? 0 : _textLength;
-  }
   const NSXMLBlock* block() const {
     return reinterpret_cast<const NSXMLBlock*>(reinterpret_cast<const char*>(this) -
                                                size_t{_aux} * 8);
   }
   static bool makeOrderComparable(const NSXMLNode* a, const NSXMLNode* b);
 
-  NSXMLNode* _parent = nullptr;
-  NSXMLNode* _next = nullptr;
+  alignas(8) NSXMLLink<NSXMLNode> _parent;
+  NSXMLLink<NSXMLNode> _next;
   union {
-    NSXMLNode* _firstChild = nullptr;
-    const void* _text;
-  };
-  union {
-    NSXMLNode* _previous = nullptr;
-    uint32_t _propertyTextLength;
-  };
-  union {
-    const NSXMLName* _name = nullptr;
+    NSXMLLink<NSXMLNode> _firstChild{};
     uint32_t _textLength;
+    NSXMLLink<const NSStringView> _textApart;
+  };
+  union {
+    NSXMLLink<NSXMLNode> _previous{};
+    NSXMLLink<const NSXMLName> _propertyName;
   };
   friend class NSXMLTree;
   friend class NSXMLElement;
@@ -295,14 +335,21 @@ class XQUERY_EXPORT NSXMLElement : public NSXMLNode {
   bool insertChild(const Ref<NSXMLNode>& child, uint32_t atIndex);
 
  private:
-  NSXMLElement() : NSXMLNode(Kind::Element) {}
+  explicit NSXMLElement(Kind kind) : NSXMLNode(kind) {}
   static NSXMLNode* namespaceOrNull(NSXMLNode* property) {
     return property && property->kind() == Kind::Namespace ? property : nullptr;
   }
 
-  NSXMLNode* _firstProperty = nullptr;
+  NSXMLLink<const NSXMLName> _name;
+  NSXMLLink<NSXMLNode> _firstProperty;
+  friend class NSXMLNode;
   friend class NSXMLTree;
 };
+
+inline const NSXMLExpandedName* NSXMLNode::expandedName() const {
+  if (kind() == Kind::Element) return static_cast<const NSXMLElement*>(this)->_name->expanded;
+  return kind() == Kind::Attribute ? _propertyName->expanded : nullptr;
+}
 
 // A whole document.
 //
@@ -374,13 +421,13 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
   bool insertChild(const Ref<NSXMLNode>& child, uint32_t atIndex);
 
  private:
-  NSXMLDocument() : NSXMLNode(Kind::Document) {}
+  explicit NSXMLDocument(Kind kind) : NSXMLNode(kind) {}
 
   NSString* _URI = nullptr;  // owned by the tree
   friend class NSXMLTree;
 };
 
-static_assert(sizeof(NSXMLNode) == 48 && sizeof(NSXMLElement) == 56 && sizeof(NSXMLDocument) == 56);
+static_assert(sizeof(NSXMLNode) == 24 && sizeof(NSXMLElement) == 32 && sizeof(NSXMLDocument) == 32);
 
 // Interned names. The returned pointer stays valid while a handle to it lives.
 class XQUERY_EXPORT NSXMLExpandedNameRef {

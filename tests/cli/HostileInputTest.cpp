@@ -124,6 +124,27 @@ TEST(HostileInput, EndlessRecursionIsAnErrorWhereTheAddressSpaceIsBounded) {
     EXPECT_THAT(outcome.err, HasSubstr("limit: expression nested too deeply")) << kilobytes;
   }
 }
+
+// The range that trees live in is smaller there.
+TEST(HostileInput, TreesAreBuiltOrRefusedWhereTheAddressSpaceIsBounded) {
+  const auto run = [](const std::string& kilobytes, const std::string& count) {
+    const std::string query =
+        "let $text := string-join(for $i in 1 to 50000 return 'abcdefghij', '') "
+        "let $all := for $i in 1 to " +
+        count + " return <e>{$text}</e> return count($all[string-length(.) = 500000])";
+    return command::start("/bin/sh", {"-c", "ulimit -v \"$2\" && exec \"$0\" -e \"$1\"",
+                                      XQUERY_BINARY_DIR "/xquery", query, kilobytes});
+  };
+  for (const std::string kilobytes : {"250000", "300000", "700000", "3000000"}) {
+    EXPECT_EQ(run(kilobytes, "10").out, "10\n") << kilobytes;
+  }
+  EXPECT_EQ(run("1000000", "200").out, "200\n");
+  for (const std::string kilobytes : {"250000", "300000", "700000"}) {
+    const Outcome outcome = run(kilobytes, "1000");
+    EXPECT_EQ(outcome.status, 1) << kilobytes;
+    EXPECT_EQ(outcome.err, "XQueryError:0 - \"limit: out of memory\"\n") << kilobytes;
+  }
+}
 #endif
 
 // The path of the dynamic loader that this program asks for.

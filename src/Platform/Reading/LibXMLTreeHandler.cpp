@@ -120,15 +120,15 @@ class TreeHandler final : public LibXMLHandler {
 
  private:
   // In the tree, once for all declarations of one URI.
-  NSStringView storedURI(LibXMLText URI);
+  const NSStringView* storedURI(LibXMLText URI);
 
   ReadTree _tree;
   NameCache _names;
-  std::unordered_map<LibXMLText, NSStringView> _URIs;
+  std::unordered_map<LibXMLText, const NSStringView*> _URIs;
 };
 
-NSStringView TreeHandler::storedURI(LibXMLText URI) {
-  if (!URI) return {};
+const NSStringView* TreeHandler::storedURI(LibXMLText URI) {
+  if (!URI) return nullptr;
   const auto [place, isNew] = _URIs.try_emplace(URI);
   if (isNew) place->second = _tree.stored(ReadText(reinterpret_cast<const char*>(URI)));
   return place->second;

@@ -92,7 +92,8 @@ class InternText {
 ReadNames::ReadNames(NSXMLTree& tree) : _tree(tree), _noPrefix(prefixOf({})) {
   auto* const URI = _memory.make<ReadNamespace>();
   URI->bytes = namespaceOfXML;
-  URI->text = NSStringView::ascii(namespaceOfXML);
+  static constexpr NSStringView text = NSStringView::ascii(namespaceOfXML);
+  URI->text = &text;
   prefixOf("xml")->bound = URI;
 }
 
@@ -181,7 +182,7 @@ const NSXMLName* ReadNames::resolve(ReadName& name, const ReadNamespace* URI,
       hash, [&](const Resolved& each) { return each.written == &name && each.URI == URI; });
   if (!found) {
     auto* const resolved = _memory.make<Resolved>();
-    *resolved = {hash, &name, URI, interned(name.bytes, URI ? URI->text : NSStringView())};
+    *resolved = {hash, &name, URI, interned(name.bytes, URI ? *URI->text : NSStringView())};
     _resolved.insert(resolved);
     found = resolved;
   }
@@ -210,15 +211,15 @@ bool mayBind(std::string_view prefix, std::string_view URI) {
 
 }  // namespace
 
-NSStringView ReadNames::declare(ReadPrefix& prefix, std::string_view URI, size_t depth,
-                                const std::function<NSStringView(std::string_view)>& store) {
+const NSStringView* ReadNames::declare(ReadPrefix& prefix, std::string_view URI, size_t depth,
+                                       const Store& store) {
   take(mayBind(prefix.bytes, URI));
   take(prefix.declaredIn != _tag);
   prefix.declaredIn = _tag;
   const ReadNamespace* const bound = URI.empty() ? nullptr : namespaceOf(URI, store);
   _bindings.push_back({depth, &prefix, prefix.bound});
   prefix.bound = bound;
-  return bound ? bound->text : NSStringView();
+  return bound ? bound->text : nullptr;
 }
 
 void ReadNames::unbind() {
@@ -227,8 +228,7 @@ void ReadNames::unbind() {
   _bindings.pop_back();
 }
 
-ReadNamespace* ReadNames::namespaceOf(std::string_view URI,
-                                      const std::function<NSStringView(std::string_view)>& store) {
+ReadNamespace* ReadNames::namespaceOf(std::string_view URI, const Store& store) {
   take(URI.size() <= longestURITaken);
   const uint64_t hash = hashOf(URI);
   ReadNamespace* entry =

@@ -20,7 +20,7 @@ class NSXMLTree;
 struct ReadNamespace {
   uint64_t hash = 0;
   std::string_view bytes;
-  NSStringView text;  // in the tree
+  const NSStringView* text = nullptr;  // in the tree
 };
 
 struct ReadPrefix {
@@ -63,10 +63,11 @@ class ReadNames {
   const NSXMLName* target(std::string_view bytes);  // of an instruction
 
   // What an element declares: from here on, until `endElement` for the same depth. `store` puts the
-  // text of a new namespace into the tree. Answers that text.
+  // text of a new namespace into the tree. Answers that text, null for no namespace.
   void startTag() { ++_tag; }
-  NSStringView declare(ReadPrefix& prefix, std::string_view URI, size_t depth,
-                       const std::function<NSStringView(std::string_view)>& store);
+  using Store = std::function<const NSStringView*(std::string_view)>;
+  const NSStringView* declare(ReadPrefix& prefix, std::string_view URI, size_t depth,
+                              const Store& store);
   void endElement(size_t depth) {
     while (!_bindings.empty() && _bindings.back().depth == depth) unbind();
   }
@@ -87,8 +88,7 @@ class ReadNames {
 
   ReadName* add(std::string_view bytes, uint64_t hash, const uint64_t (&head)[2]);
   ReadPrefix* prefixOf(std::string_view bytes);
-  ReadNamespace* namespaceOf(std::string_view URI,
-                             const std::function<NSStringView(std::string_view)>& store);
+  ReadNamespace* namespaceOf(std::string_view URI, const Store& store);
   const NSXMLName* resolve(ReadName& name, const ReadNamespace* URI, ReadName::Interned& last);
   const NSXMLName* interned(std::string_view bytes, NSStringView URI);
   void unbind();

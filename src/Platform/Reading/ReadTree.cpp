@@ -36,39 +36,43 @@ ReadTree::ReadTree(uint32_t options, size_t expectedBytes)
 
 // --- texts -----------------------------------------------------------------------------------
 
-NSStringView ReadTree::inItsWidth(const ReadText& text) {
+template <class Add>
+auto ReadTree::withStorable(const ReadText& text, Add add) {
   if (text.isASCII) {
     checkLength(text.bytes.size());
-    return NSStringView::ascii(text.bytes);
+    return add(NSStringView::ascii(text.bytes));
   }
-  if (text.bytes.size() > longestWidened) return storedAlone(text.bytes);
-  if (_units.size() < text.bytes.size())
-    _units.resize(std::min(2 * text.bytes.size(), longestWidened));
-  const char16_t* const end = widenXML(text.bytes, _units.data());
+  if (text.bytes.size() > longestWidened) return add(storedAlone(text.bytes));
+  return add(widened(text.bytes));
+}
+
+NSStringView ReadTree::widened(std::string_view text) {
+  if (_units.size() < text.size()) _units.resize(std::min(2 * text.size(), longestWidened));
+  const char16_t* const end = widenXML(text, _units.data());
   if (!end) throw LibXMLStop{notText};
   return {_units.data(), static_cast<uint32_t>(end - _units.data())};
 }
 
-NSStringView ReadTree::storedAlone(std::string_view text) {
+const NSStringView* ReadTree::storedAlone(std::string_view text) {
   const size_t count = countXMLUnits(text);
   if (count == notXMLText) throw LibXMLStop{notText};
   checkLength(count);
-  auto* const units =
-      static_cast<char16_t*>(_builder.tree().allocateText(count * sizeof(char16_t)));
+  char16_t* const units = _builder.roomForUnits(count);
   widenXML(text, units);
-  return {units, static_cast<uint32_t>(count)};
+  return _builder.storeFilled({units, static_cast<uint32_t>(count)});
 }
 
-NSStringView ReadTree::stored(const ReadText& text) {
-  const NSStringView view = inItsWidth(text);
-  const bool isStored = !text.isASCII && text.bytes.size() > longestWidened;
-  return isStored ? view : _builder.addText(view);
+const NSStringView* ReadTree::stored(const ReadText& text) {
+  struct Storing {
+    NSXMLTreeBuilder& builder;
+    const NSStringView* operator()(NSStringView view) const { return builder.store(view); }
+    const NSStringView* operator()(const NSStringView* stored) const { return stored; }
+  };
+  return withStorable(text, Storing{_builder});
 }
 
-NSXMLNode* ReadTree::addTextNode(const ReadText& text) {
-  NSXMLNode* const node = _builder.addLeaf(Kind::Text);
-  NSXMLTree::setStoredText(node, stored(text));
-  return node;
+NSXMLNode* ReadTree::addLeaf(Kind kind, const ReadText& text) {
+  return withStorable(text, [&](auto storable) { return _builder.addLeaf(kind, storable); });
 }
 
 bool ReadTree::isKept(std::string_view text) const {
@@ -76,7 +80,7 @@ bool ReadTree::isKept(std::string_view text) const {
 }
 
 void ReadTree::addWholeText(const ReadText& text) {
-  if (isKept(text.bytes)) addTextNode(text);
+  if (isKept(text.bytes)) addLeaf(Kind::Text, text);
 }
 
 void ReadTree::addText(std::string_view text) {
@@ -84,7 +88,7 @@ void ReadTree::addText(std::string_view text) {
 }
 
 void ReadTree::addPending(bool isSection) {
-  NSXMLNode* const node = addTextNode(ReadText(_pending));
+  NSXMLNode* const node = addLeaf(Kind::Text, ReadText(_pending));
   if (isSection) NSXMLTree::setCDATA(node);
   // A huge text must not hold its memory a second time until the end.
   constexpr size_t kept = size_t{1} << 20;
@@ -121,13 +125,17 @@ void ReadTree::openElement(const NSXMLName* name) {
   _builder.openElement(name);
 }
 
-void ReadTree::addNamespace(const NSXMLName* prefix, NSStringView storedURI) {
-  NSXMLTree::setStoredText(_builder.addProperty(Kind::Namespace, prefix), storedURI);
+void ReadTree::addNamespace(const NSXMLName* prefix, const NSStringView* storedURI) {
+  if (storedURI) {
+    _builder.addProperty(Kind::Namespace, prefix, storedURI);
+  } else {
+    _builder.addProperty(Kind::Namespace, prefix, NSStringView());
+  }
 }
 
 void ReadTree::addAttribute(const NSXMLName* name, const ReadText& value) {
-  NSXMLNode* const attribute = _builder.addProperty(Kind::Attribute, name);
-  NSXMLTree::setStoredText(attribute, stored(value));
+  withStorable(
+      value, [&](auto storable) { return _builder.addProperty(Kind::Attribute, name, storable); });
   if (name->prefixLength) hearSpace(name, value.bytes);
 }
 
@@ -151,12 +159,12 @@ void ReadTree::closeElement() {
 
 void ReadTree::addComment(const ReadText& text) {
   flush();
-  NSXMLTree::setStoredText(_builder.addLeaf(Kind::Comment), stored(text));
+  addLeaf(Kind::Comment, text);
 }
 
 void ReadTree::addInstruction(const NSXMLName* target, const ReadText& text) {
   flush();
-  NSXMLTree::setStoredText(_builder.addLeaf(Kind::ProcessingInstruction, target), stored(text));
+  withStorable(text, [&](auto storable) { return _builder.addInstruction(target, storable); });
 }
 
 }  // namespace xquery

@@ -35,7 +35,7 @@ class ReadTree {
   // Names must have been adopted by the tree. Of an element, its namespaces and then its attributes
   // follow.
   void openElement(const NSXMLName* name);
-  void addNamespace(const NSXMLName* prefix, NSStringView storedURI);
+  void addNamespace(const NSXMLName* prefix, const NSStringView* storedURI);  // null for no URI
   void addAttribute(const NSXMLName* name, const ReadText& value);
   void closeElement();
   // A piece of text. The first is for one that nothing is added to any more.
@@ -46,7 +46,7 @@ class ReadTree {
   void addComment(const ReadText& text);
   void addInstruction(const NSXMLName* target, const ReadText& text);
   // For nodes to share.
-  NSStringView stored(const ReadText& text);
+  const NSStringView* stored(const ReadText& text);
 
  private:
   // An element under which xml:space changes what is kept.
@@ -57,11 +57,14 @@ class ReadTree {
 
   void flush();
   bool isKept(std::string_view text) const;
-  NSXMLNode* addTextNode(const ReadText& text);
+  NSXMLNode* addLeaf(Kind kind, const ReadText& text);  // a text or a comment
   void addPending(bool isSection);
-  NSStringView storedAlone(std::string_view text);
-  // In the width in which it is stored, good until the next text.
-  NSStringView inItsWidth(const ReadText& text);
+  // Calls `add` with the text in the width in which it is stored: with a view of it that is good
+  // until the next text, or with where it is stored already.
+  template <class Add>
+  auto withStorable(const ReadText& text, Add add);
+  NSStringView widened(std::string_view text);
+  const NSStringView* storedAlone(std::string_view text);
   void hearSpace(const NSXMLName* name, std::string_view value);
 
   bool _alwaysKeepsWhitespace;

@@ -65,7 +65,7 @@ class XMLReader {
   struct Attribute {
     ReadName* name;
     Raw value;
-    NSStringView URI;  // that it declares, in the tree
+    const NSStringView* URI = nullptr;  // that it declares, in the tree; null for none
   };
 
   bool getMore();

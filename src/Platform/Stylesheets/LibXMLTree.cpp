@@ -305,7 +305,11 @@ class Importer {
 
   void visit(const xmlNode* node);
   void openElement(const xmlNode* element);
-  void setText(NSXMLNode* node, std::string_view text);
+  // Calls `work` with the text as it is to be stored.
+  template <class Work>
+  void withText(std::string_view text, Work work);
+  NSXMLNode* addLeaf(Kind kind, const xmlNode* node);
+  void addProperty(Kind kind, const NSXMLName* name, std::string_view text);
   const NSXMLName* name(const xmlChar* name, const xmlNs* ns);
   const NSXMLName* makeName(const xmlChar* name, const xmlNs* ns);
 
@@ -346,18 +350,18 @@ void Importer::visit(const xmlNode* node) {
       openElement(node);
       break;
     case XML_TEXT_NODE:
-    case XML_CDATA_SECTION_NODE: {
-      NSXMLNode* text = _builder.addLeaf(Kind::Text);
-      setText(text, viewOf(node->content));
-      if (node->type == XML_CDATA_SECTION_NODE) NSXMLTree::setCDATA(text);
+      addLeaf(Kind::Text, node);
       break;
-    }
+    case XML_CDATA_SECTION_NODE:
+      NSXMLTree::setCDATA(addLeaf(Kind::Text, node));
+      break;
     case XML_COMMENT_NODE:
-      setText(_builder.addLeaf(Kind::Comment), viewOf(node->content));
+      addLeaf(Kind::Comment, node);
       break;
     case XML_PI_NODE:
-      setText(_builder.addLeaf(Kind::ProcessingInstruction, name(node->name, nullptr)),
-              viewOf(node->content));
+      withText(viewOf(node->content), [&](NSStringView text) {
+        _builder.addInstruction(name(node->name, nullptr), text);
+      });
       break;
     default:
       break;
@@ -374,29 +378,40 @@ void Importer::openElement(const xmlNode* element) {
   for (const xmlNs* declared = element->nsDef; declared; declared = declared->next) {
     pacer.turn();
     const xmlChar* prefix = declared->prefix ? declared->prefix : noText;
-    setText(_builder.addProperty(Kind::Namespace, name(prefix, nullptr)), viewOf(declared->href));
+    addProperty(Kind::Namespace, name(prefix, nullptr), viewOf(declared->href));
   }
   for (const xmlAttr* attribute = element->properties; attribute; attribute = attribute->next) {
     pacer.turn();
-    NSXMLNode* made = _builder.addProperty(Kind::Attribute, name(attribute->name, attribute->ns));
+    const NSXMLName* const made = name(attribute->name, attribute->ns);
     const xmlNode* value = attribute->children;
     if (value && !value->next && isText(value)) {
-      setText(made, viewOf(value->content));
+      addProperty(Kind::Attribute, made, viewOf(value->content));
     } else {
       const std::unique_ptr<xmlChar, FreeText> text(
           xmlNodeListGetString(element->doc, attribute->children, 1));
-      setText(made, viewOf(text.get()));
+      addProperty(Kind::Attribute, made, viewOf(text.get()));
     }
   }
 }
 
-void Importer::setText(NSXMLNode* node, std::string_view text) {
+template <class Work>
+void Importer::withText(std::string_view text, Work work) {
   chargeWork(text.size() / 4096);
   if (isASCII(text)) {
-    _builder.tree().setText(node, NSStringView::ascii(text));
+    work(NSStringView::ascii(text));
   } else {
-    _builder.tree().setText(node, NSString::stringWithUTF8Replacing(text)->view());
+    work(NSString::stringWithUTF8Replacing(text)->view());
   }
+}
+
+NSXMLNode* Importer::addLeaf(Kind kind, const xmlNode* node) {
+  NSXMLNode* leaf = nullptr;
+  withText(viewOf(node->content), [&](NSStringView text) { leaf = _builder.addLeaf(kind, text); });
+  return leaf;
+}
+
+void Importer::addProperty(Kind kind, const NSXMLName* name, std::string_view text) {
+  withText(text, [&](NSStringView stored) { _builder.addProperty(kind, name, stored); });
 }
 
 const NSXMLName* Importer::name(const xmlChar* name, const xmlNs* ns) {

@@ -2,6 +2,7 @@
 
 #include "Platform/Base/Abandoned.h"
 #include "Platform/Base/LastingObjects.h"
+#include "Platform/Base/RangeMemory.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/UTF16.h"
 #include "Platform/Tree/Credit.h"
@@ -11,8 +12,6 @@
 #include <algorithm>
 #include <atomic>
 #include <cstdlib>
-#include <limits>
-#include <malloc.h>
 #include <mutex>
 #include <new>
 #include <optional>
@@ -22,61 +21,45 @@ namespace xquery {
 
 namespace {
 
-// Small blocks come from the object allocator's lists, in multiples of this size; the size is noted
-// in the low bits of the block's link. Size class 0 is a block of malloc's.
-constexpr size_t blockGranule = 16;
-constexpr size_t largestSmallBlock = 128;
-constexpr uintptr_t sizeClassBits = blockGranule - 1;
-
-// Distances within a block are 16-bit counts of 8 bytes.
-constexpr size_t distanceUnit = 8;
-constexpr size_t largestNodeBlock = size_t{1} << 19;
-constexpr size_t largestTextBlock = size_t{1} << 20;
-static_assert((largestNodeBlock - 1) / distanceUnit <= std::numeric_limits<uint16_t>::max());
-
-constexpr size_t largestNode = 56;
-static_assert(sizeof(NSXMLProcessingInstruction) <= largestNode);
-
-NSXMLBlock* nextBlock(const NSXMLBlock* block) {
-  return reinterpret_cast<NSXMLBlock*>(block->next & ~sizeClassBits);
-}
-
-void setNextBlock(NSXMLBlock* block, const NSXMLBlock* next) {
-  block->next = reinterpret_cast<uintptr_t>(next) | (block->next & sizeClassBits);
-}
-
-constexpr size_t roundedUp(size_t value, size_t unit) {
-  return (value + unit - 1) / unit * unit;
-}
+static_assert(sizeof(NSXMLProcessingInstruction) == 32);
+static_assert(NSXMLRange == RangeRuns::windowBytes);
 
 size_t bytesOf(NSStringView text) {
   return size_t{text.length()} * (text.isWide() ? sizeof(char16_t) : 1);
 }
 
-// The text copied to `memory`, which has room for it.
-NSStringView copyText(void* memory, NSStringView text, bool narrow) {
-  if (!narrow) {
-    std::memcpy(memory, text.wideUnits(), bytesOf(text));
-    return {static_cast<const char16_t*>(memory), text.length()};
-  }
-  auto* units = static_cast<char*>(memory);
-  if (text.isWide()) {
-    std::copy_n(text.wideUnits(), text.length(), units);
-  } else if (!text.isEmpty()) {
-    std::memcpy(units, text.asciiUnits(), text.length());
-  }
-  return {units, text.length()};
-}
+// A text as it is to be stored.
+struct TextToStore {
+  explicit TextToStore(NSStringView text)
+      : from(text),
+        isNarrow(xquery::isNarrow(text)),
+        bytes(isNarrow ? text.length() : bytesOf(text)) {}
 
-// Of a block of malloc's just got. The block does not note its size, but malloc does.
-void countLargeBlock(void* block) {
-  try {
-    countValueBlock(malloc_usable_size(block));
-  } catch (...) {
-    std::free(block);
-    throw;
+  // Copied to `memory`, which has room for it.
+  NSStringView copiedTo(void* memory) const {
+    if (!isNarrow) {
+      std::memcpy(memory, from.wideUnits(), bytes);
+      return {static_cast<const char16_t*>(memory), from.length()};
+    }
+    auto* units = static_cast<char*>(memory);
+    if (from.isWide()) {
+      std::copy_n(from.wideUnits(), bytes, units);
+    } else if (bytes) {
+      std::memcpy(units, from.asciiUnits(), bytes);
+    }
+    return {units, from.length()};
   }
-}
+  // The same behind a view of it.
+  static constexpr size_t viewBytes = sizeof(NSStringView);
+  const NSStringView* copiedWithView(void* memory) const {
+    auto* const view = static_cast<NSStringView*>(memory);
+    return ::new (view) NSStringView(copiedTo(view + 1));
+  }
+
+  const NSStringView from;
+  const bool isNarrow;
+  const size_t bytes;
+};
 
 // Renumbering is rare and short, so that trees share a few locks.
 std::mutex& orderLock(const NSXMLTree* tree) {
@@ -157,13 +140,9 @@ namespace {
 // Of a row of blocks, from this one on.
 void freeRow(NSXMLBlock* block) {
   for (size_t count = 1; block; ++count) {
-    NSXMLBlock* const next = nextBlock(block);
-    if (const size_t sizeClass = block->next & sizeClassBits) {
-      NSCounted::operator delete(block, sizeClass* blockGranule);
-    } else {
-      uncountValueBytes(malloc_usable_size(block));
-      std::free(block);
-    }
+    NSXMLBlock* const next = block->next;
+    uncountValueBytes(sizeof(NSXMLBlock) + NSXMLTree::roomOf(block));
+    giveRangeBlock(block);
     block = next;
     if (count % AbandonedValues::partsPerLook != 0 || !block || !abandonedValues) continue;
     const auto free = [](const void* rest) {
@@ -178,8 +157,8 @@ void freeRow(NSXMLBlock* block) {
 
 void NSXMLTree::freeBlocks() {
   if (!_lastBlock) return;
-  NSXMLBlock* const first = nextBlock(_lastBlock);
-  setNextBlock(_lastBlock, nullptr);
+  NSXMLBlock* const first = _lastBlock->next;
+  _lastBlock->next = nullptr;
   freeRow(first);
 }
 
@@ -244,144 +223,62 @@ void NSXMLTree::setBlockCount(uint64_t count) {
   blockCountLow = static_cast<uint16_t>(kept);
 }
 
-// A new block at the end of the ring, with room for that many bytes after its head.
 NSXMLBlock* NSXMLTree::allocateBlock(size_t bytes) {
-  const size_t size = roundedUp(sizeof(NSXMLBlock) + bytes, blockGranule);
-  const bool isSmall = size <= largestSmallBlock;
-  void* memory = isSmall ? NSCounted::operator new(size) : std::malloc(size);
-  if (!memory) throw std::bad_alloc();
-  if (!isSmall) countLargeBlock(memory);
-  auto* block = ::new (memory) NSXMLBlock{this, isSmall ? size / blockGranule : 0};
-  if (_lastBlock) {
-    setNextBlock(block, nextBlock(_lastBlock));
-    setNextBlock(_lastBlock, block);
-  } else {
-    setNextBlock(block, block);
+  const size_t counted = rangeBlockBytes(sizeof(NSXMLBlock) + bytes);
+  countValueBlock(counted);
+  RangeBlock memory;
+  try {
+    memory = takeRangeBlock(counted);
+  } catch (...) {
+    uncountValueBytes(counted);
+    throw;
   }
+  countValueBytes(memory.bytes - counted);
+  auto* const block = ::new (memory.address) NSXMLBlock;
+  block->tree = this;
+  block->roomUnits = static_cast<uint32_t>((memory.bytes - sizeof(NSXMLBlock)) / distanceUnit);
+  block->next = _lastBlock ? _lastBlock->next.get() : block;
+  if (_lastBlock) _lastBlock->next = block;
   _lastBlock = block;
   setBlockCount(uint64_t{blockCount()} + 1);
   return block;
 }
 
-void NSXMLTree::startBulk(size_t nodeBytes, size_t textBytes) {
-  NSXMLTreeExtra& state = makeExtra();
-  state.isBulk = true;
-  state.nextNodeBlock = std::min(roundedUp(nodeBytes, blockGranule), largestNodeBlock / 2);
-  state.nextTextBlock = std::min(textBytes, largestTextBlock / 2);
-}
-
-void NSXMLTree::endBulk() {
-  NSXMLTreeExtra* state = extra();
-  if (!state) return;
-  state->isBulk = false;
-  if (!state->documents.empty() || state->names.count() > NSXMLNameList::longest) return;
-  // A small tree needs no extra part any more.
-  const std::unique_ptr<NSXMLTreeExtra> owned(state);
-  _extra = 0;
-  owned->names.forEach([this](const NSXMLName* name) { adopt(name); });
-}
-
-void* NSXMLTree::allocateBulkNode(size_t bytes, uint16_t& distance) {
-  NSXMLTreeExtra& state = *extra();
-  if (static_cast<size_t>(state.nodeEnd - state.nodeCursor) < bytes) {
-    const size_t room = std::max(state.nextNodeBlock, bytes);
-    state.nodeBlock = reinterpret_cast<char*>(allocateBlock(room));
-    state.nodeCursor = state.nodeBlock + sizeof(NSXMLBlock);
-    state.nodeEnd = state.nodeCursor + room;
-    state.nextNodeBlock = std::min(room * 2, largestNodeBlock - sizeof(NSXMLBlock));
-  }
-  char* node = state.nodeCursor;
-  state.nodeCursor += bytes;
-  distance = static_cast<uint16_t>(static_cast<size_t>(node - state.nodeBlock) / distanceUnit);
-  return node;
-}
-
-void* NSXMLTree::allocateNode(size_t bytes, size_t textBytes, uint16_t& distance) {
-  if (const NSXMLTreeExtra* state = extra(); state && state->isBulk) {
-    return allocateBulkNode(bytes, distance);
-  }
-  distance = sizeof(NSXMLBlock) / distanceUnit;
-  return allocateBlock(bytes + textBytes) + 1;
-}
-
-void* NSXMLTree::allocateText(size_t bytes) {
-  NSXMLTreeExtra* state = extra();
-  if (!state || !state->isBulk) return allocateBlock(bytes) + 1;
-  // Keep texts at even addresses, for those in UTF-16.
-  const size_t rounded = roundedUp(bytes, alignof(char16_t));
-  if (static_cast<size_t>(state->textEnd - state->textCursor) < rounded) {
-    // A text that would waste much of a block has one of its own.
-    if (rounded > state->nextTextBlock / 4) return allocateBlock(rounded) + 1;
-    const size_t room = state->nextTextBlock;
-    state->textCursor = reinterpret_cast<char*>(allocateBlock(room) + 1);
-    state->textEnd = state->textCursor + room;
-    state->nextTextBlock = std::min(room * 2, largestTextBlock);
-  }
-  char* text = state->textCursor;
-  state->textCursor += rounded;
-  return text;
-}
-
 // --- nodes -----------------------------------------------------------------------------------
 
-template <class Node, class... Arguments>
-Node* NSXMLTree::placeNode(void* memory, uint16_t distance, Arguments... arguments) {
-  Node* node = ::new (memory) Node(arguments...);
-  node->_aux = distance;
-  return node;
-}
-
-template <class Node, class... Arguments>
-Node* NSXMLTree::makeNodeOf(size_t textBytes, Arguments... arguments) {
-  uint16_t distance = 0;
-  void* memory = allocateNode(sizeof(Node), textBytes, distance);
-  return placeNode<Node>(memory, distance, arguments...);
-}
-
 NSXMLElement* NSXMLTree::makeElement() {
-  return makeNodeOf<NSXMLElement>(0);
+  return makeNodeOf<NSXMLElement>(Kind::Element);
 }
 NSXMLDocument* NSXMLTree::makeDocument() {
-  return makeNodeOf<NSXMLDocument>(0);
-}
-
-NSXMLNode* NSXMLTree::makeNode(Kind kind) {
-  return kind == Kind::ProcessingInstruction ? makeNodeOf<NSXMLProcessingInstruction>(0)
-                                             : makeNodeOf<NSXMLNode>(0, kind);
+  return makeNodeOf<NSXMLDocument>(Kind::Document);
 }
 
 NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text) {
-  const bool narrow = isNarrow(text);
-  const size_t textBytes = narrow ? text.length() : bytesOf(text);
-  const NSXMLTreeExtra* state = extra();
-  const bool isBulk = state && state->isBulk;
-  const bool isPI = kind == Kind::ProcessingInstruction;
-  NSXMLNode* node = isPI ? makeNodeOf<NSXMLProcessingInstruction>(textBytes)
-                         : makeNodeOf<NSXMLNode>(textBytes, kind);
-  const size_t nodeBytes = isPI ? sizeof(NSXMLProcessingInstruction) : sizeof(NSXMLNode);
-  void* memory = isBulk ? allocateText(textBytes) : reinterpret_cast<char*>(node) + nodeBytes;
-  setStoredText(node, copyText(memory, text, narrow));
+  const TextToStore stored(text);
+  if (kind == Kind::ProcessingInstruction) {
+    auto* const node =
+        makeNodeOf<NSXMLProcessingInstruction>(kind, TextToStore::viewBytes + stored.bytes);
+    setTextApart(node, stored.copiedWithView(node + 1));
+    return node;
+  }
+  auto* const node = makeNodeOf<NSXMLNode>(kind, stored.bytes);
+  noteTextBehind(node, stored.copiedTo(node + 1));
   return node;
 }
 
-void NSXMLTree::setStoredText(NSXMLNode* node, NSStringView text) {
-  node->_text = text.isWide() ? static_cast<const void*>(text.wideUnits()) : text.asciiUnits();
-  (node->isProperty() ? node->_propertyTextLength : node->_textLength) = text.length();
-  node->_flags = static_cast<uint8_t>(text.isWide() ? node->_flags | NSXMLNode::WideText
-                                                    : node->_flags & ~NSXMLNode::WideText);
-}
-
 void NSXMLTree::setText(NSXMLNode* node, NSStringView text) {
-  const bool narrow = isNarrow(text);
-  const size_t textBytes = narrow ? text.length() : bytesOf(text);
-  setStoredText(node, copyText(allocateText(textBytes), text, narrow));
+  const TextToStore stored(text);
+  NSXMLBlock* const block = allocateBlock(TextToStore::viewBytes + stored.bytes);
+  setTextApart(node, stored.copiedWithView(block + 1));
 }
 
 void NSXMLTree::setAdoptedName(NSXMLNode* node, const NSXMLName* name) {
-  if (auto* instruction = dyn_cast<NSXMLProcessingInstruction>(node)) {
+  if (auto* element = dyn_cast<NSXMLElement>(node)) {
+    element->_name = name;
+  } else if (auto* instruction = dyn_cast<NSXMLProcessingInstruction>(node)) {
     instruction->_target = name;
   } else {
-    node->_name = name;
+    node->_propertyName = name;
   }
 }
 
@@ -447,12 +344,11 @@ NSXMLElement* NSXMLTree::makeLoneElement(NSStringView name, NSStringView URI) {
 }
 
 NSXMLElement* NSXMLTree::makeElement(size_t roomBytes, NSXMLRoom& room) {
-  const size_t bytes = sizeof(NSXMLElement) + roomBytes;
-  NSXMLBlock* block = allocateBlock(bytes);
-  auto* element = placeNode<NSXMLElement>(block + 1, uint16_t{sizeof(NSXMLBlock) / distanceUnit});
+  NSXMLBlock* const block = allocateBlock(sizeof(NSXMLElement) + roomBytes);
+  auto* const element = placeNode<NSXMLElement>(block, block + 1, Kind::Element);
   room._block = reinterpret_cast<char*>(block);
   room._cursor = reinterpret_cast<char*>(element + 1);
-  room._end = room._block + roundedUp(sizeof(NSXMLBlock) + bytes, blockGranule);
+  room._end = reinterpret_cast<char*>(block + 1) + roomOf(block);
   return element;
 }
 
@@ -479,23 +375,12 @@ NSXMLNode* NSXMLTree::makeAttributeInPlace(const NSXMLName* name, NSStringView t
 }
 
 NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text, NSXMLRoom& room) {
-  if (static_cast<size_t>(room._end - room._cursor) < sizeof(NSXMLNode)) {
-    return makeNode(kind, text);
-  }
-  auto* node = placeNode<NSXMLNode>(
-      room._cursor, static_cast<uint16_t>((room._cursor - room._block) / ptrdiff_t{distanceUnit}),
-      kind);
-  room._cursor += sizeof(NSXMLNode);
-  const bool narrow = isNarrow(text);
-  const size_t textBytes = narrow ? text.length() : bytesOf(text);
-  const size_t rounded = roundedUp(textBytes, distanceUnit);
-  void* memory = room._cursor;
-  if (rounded <= static_cast<size_t>(room._end - room._cursor)) {
-    room._cursor += rounded;
-  } else {
-    memory = allocateText(textBytes);
-  }
-  setStoredText(node, copyText(memory, text, narrow));
+  const TextToStore stored(text);
+  const size_t bytes = sizeof(NSXMLNode) + roomForText(stored.bytes);
+  if (static_cast<size_t>(room._end - room._cursor) < bytes) return makeNode(kind, text);
+  auto* const node = placeNode<NSXMLNode>(room._block, room._cursor, kind);
+  room._cursor += bytes;
+  noteTextBehind(node, stored.copiedTo(node + 1));
   return node;
 }
 
@@ -545,11 +430,11 @@ void NSXMLTree::absorb(NSXMLTree* smaller) {
   NSXMLBlock* block = smaller->_lastBlock;
   do {
     block->tree = this;
-    block = nextBlock(block);
+    block = block->next;
   } while (block != smaller->_lastBlock);
-  NSXMLBlock* first = nextBlock(_lastBlock);
-  setNextBlock(_lastBlock, nextBlock(smaller->_lastBlock));
-  setNextBlock(smaller->_lastBlock, first);
+  NSXMLBlock* const first = _lastBlock->next;
+  _lastBlock->next = smaller->_lastBlock->next;
+  smaller->_lastBlock->next = first;
   setBlockCount(uint64_t{blockCount()} + smaller->blockCount());
   _era = std::min(_era, smaller->_era);
   const uint64_t sum = uint64_t{references} + smaller->references;
@@ -663,7 +548,7 @@ void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property) {
   noteChange(element);
   // Namespaces before attributes, each in the order of their arrival.
   const bool isNamespace = property->kind() == Kind::Namespace;
-  NSXMLNode** link = &element->_firstProperty;
+  Link* link = &element->_firstProperty;
   while (*link && !(isNamespace && (*link)->kind() == Kind::Attribute)) link = &(*link)->_next;
   property->_parent = element;
   property->_next = *link;
@@ -686,7 +571,7 @@ void NSXMLTree::appendProperty(NSXMLElement* element, NSXMLNode* property, NSXML
 void NSXMLTree::unlink(NSXMLNode* node) {
   NSXMLNode* parent = node->_parent;
   if (node->isProperty()) {
-    NSXMLNode** link = &cast<NSXMLElement>(parent)->_firstProperty;
+    Link* link = &cast<NSXMLElement>(parent)->_firstProperty;
     while (*link != node) link = &(*link)->_next;
     *link = node->_next;
   } else {

@@ -1,9 +1,10 @@
 // The arena of a tree.
 //
-//   NSXMLTree (48 bytes)        block of one node           bulk node block       text block
-//     count, order, blocks        head: tree, next            head, end             head
-//     last block ---------------> node                        node node node ...    text text ...
-//     names, cursors              [its text]
+//   NSXMLTree (48 bytes)        block of one node           block of a builder        block of a
+//   text
+//     count, order, blocks        head: tree, next            head                      head
+//     last block ---------------> node                        node [its text]           view of it
+//     names                       [its text]                  node [its text] ...       text
 //     base URIs on record
 //     indexes, era
 //
@@ -14,8 +15,8 @@
 // and neither nodes nor readers are involved.
 //
 // Nodes made singly come in blocks just large enough, together with their text, since a query may
-// construct very many small elements. Trees that are parsed or copied grow by large blocks; the
-// state for that, and whatever else a small tree does not need, is in the extra part.
+// construct very many small elements. Trees that are parsed or copied grow by large blocks, see
+// TreeBuilder.h. All blocks are in the range that nodes refer to each other in.
 #pragma once
 
 #include "xquery/XMLNode.h"
@@ -35,8 +36,8 @@ class NSXMLProcessingInstruction : public NSXMLNode {
   }
 
  private:
-  NSXMLProcessingInstruction() : NSXMLNode(Kind::ProcessingInstruction) {}
-  const NSXMLName* _target = nullptr;
+  explicit NSXMLProcessingInstruction(Kind kind) : NSXMLNode(kind) {}
+  NSXMLLink<const NSXMLName> _target;
   friend class NSXMLTree;
 };
 
@@ -105,12 +106,7 @@ class NSXMLTree : public NSXMLTreeHead {
   void removeReferences(uint32_t count);
 
   // --- nodes: without parent, order number 0 ---------------------------------------------------
-  // From now on nodes and texts come from large blocks, the first with room for that many bytes.
-  void startBulk(size_t nodeBytes, size_t textBytes);
-  // What is left of the newest blocks stays unused.
-  void endBulk();
-  // All kinds but elements and documents.
-  NSXMLNode* makeNode(Kind kind);
+  // All kinds but elements and documents. Texts are copied, in 8-bit form if they fit it.
   NSXMLNode* makeNode(Kind kind, NSStringView text);
   NSXMLElement* makeElement();
   NSXMLDocument* makeDocument();
@@ -130,7 +126,14 @@ class NSXMLTree : public NSXMLTreeHead {
   // An attribute or a text, in the room as far as that goes; in the element's tree in any case.
   NSXMLNode* makeNode(Kind kind, NSStringView text, NSXMLRoom& room);
   static constexpr size_t roomForNode = sizeof(NSXMLNode);
+  // What a text takes behind a node.
+  static constexpr size_t roomForText(size_t bytes) { return (bytes + 7) & ~size_t{7}; }
   [[nodiscard]] static NSXMLNode* makeLoneAttribute(const NSXMLName* name, NSStringView text);
+
+  // Distances of nodes from the heads of their blocks are 16-bit counts of so many bytes.
+  static constexpr size_t distanceUnit = 8;
+  static constexpr size_t largestNodeBlock = (UINT16_MAX + size_t{1}) * distanceUnit;
+  static size_t roomOf(const NSXMLBlock* block) { return size_t{block->roomUnits} * distanceUnit; }
 
   // --- names and texts -------------------------------------------------------------------------
   // The tree takes over one count of the name.
@@ -148,16 +151,9 @@ class NSXMLTree : public NSXMLTreeHead {
   // Counts the name for this tree unless it is counted already.
   void use(const NSXMLName* name);
   bool holds(const NSXMLName* name) const;
-  // Copies the text into the arena, in 8-bit form if it fits it.
+  // Copies the text into the arena, in 8-bit form if it fits it. What was the text before stays
+  // where it is, since strings may refer to it.
   void setText(NSXMLNode* node, NSStringView text);
-  // Room for that many bytes of text, at an even address for the sake of UTF-16.
-  void* allocateText(size_t bytes);
-  // What a text takes of a bulk text block.
-  static size_t roomForText(NSStringView text) {
-    return text.isWide() ? size_t{text.length()} * 2 : (size_t{text.length()} + 1) & ~size_t{1};
-  }
-  // For a text that is in the arena.
-  static void setStoredText(NSXMLNode* node, NSStringView text);
   void setURI(NSXMLDocument* document, const NSString* URI);  // null for none
 
   // --- base URIs on record (XMLBaseURIs.cpp) ---------------------------------------------------
@@ -203,11 +199,14 @@ class NSXMLTree : public NSXMLTreeHead {
   // Before the text of a node that may be known changes.
   static void noteTextChange(const NSXMLNode* node);
   // For builders: the fields of a node, as they are.
-  static NSXMLNode*& parentOf(NSXMLNode* node) { return node->_parent; }
-  static NSXMLNode*& nextOf(NSXMLNode* node) { return node->_next; }
-  static NSXMLNode*& previousOf(NSXMLNode* node) { return node->_previous; }
-  static NSXMLNode*& firstChildOf(NSXMLNode* node) { return node->_firstChild; }
-  static NSXMLNode*& firstPropertyOf(NSXMLElement* element) { return element->_firstProperty; }
+  using Link = NSXMLLink<NSXMLNode>;
+  static Link& parentOf(NSXMLNode* node) { return node->_parent; }
+  static Link& nextOf(NSXMLNode* node) { return node->_next; }
+  static Link& previousOf(NSXMLNode* node) { return node->_previous; }
+  static Link& firstChildOf(NSXMLNode* node) { return node->_firstChild; }
+  static Link& firstPropertyOf(NSXMLElement* element) { return element->_firstProperty; }
+  static NSXMLLink<const NSXMLName>& nameOf(NSXMLElement* element) { return element->_name; }
+  static NSXMLLink<const NSXMLName>& propertyNameOf(NSXMLNode* node) { return node->_propertyName; }
   static NSXMLNode* firstPropertyOf(const NSXMLElement* element) { return element->_firstProperty; }
   static NSXMLNode* nextProperty(const NSXMLNode* property) { return property->_next; }
   static bool mayHaveChildren(const NSXMLNode* node) { return node->isBranch(); }
@@ -242,15 +241,33 @@ class NSXMLTree : public NSXMLTreeHead {
 
   uint32_t blockCount() const { return blockCountHigh << 16 | blockCountLow; }
   void setBlockCount(uint64_t count);
+  // A new block at the end of the ring, with room for that many bytes after its head.
   NSXMLBlock* allocateBlock(size_t bytes);
   void freeBlocks();
   bool isSetAside();
-  void* allocateNode(size_t bytes, size_t textBytes, uint16_t& distance);
-  void* allocateBulkNode(size_t bytes, uint16_t& distance);
-  template <class Node, class... Arguments>
-  static Node* placeNode(void* memory, uint16_t distance, Arguments... arguments);
-  template <class Node, class... Arguments>
-  Node* makeNodeOf(size_t textBytes, Arguments... arguments);
+  template <class Node>
+  static Node* placeNode(const void* block, void* memory, Kind kind) {
+    const auto distance = static_cast<const char*>(memory) - static_cast<const char*>(block);
+    Node* const node = ::new (memory) Node(kind);
+    node->_aux = static_cast<uint16_t>(static_cast<size_t>(distance) / distanceUnit);
+    return node;
+  }
+  // A node in a block of its own, with room for a text.
+  template <class Node>
+  Node* makeNodeOf(Kind kind, size_t textBytes = 0) {
+    NSXMLBlock* const block = allocateBlock(sizeof(Node) + textBytes);
+    return placeNode<Node>(block, block + 1, kind);
+  }
+  // Of a text that has been put behind the node, or elsewhere in the arena.
+  static void noteTextBehind(NSXMLNode* node, NSStringView text) {
+    node->_textLength = text.length();
+    if (text.isWide()) node->_flags |= NSXMLNode::WideText;
+  }
+  static void setTextApart(NSXMLNode* node, const NSStringView* text) {
+    node->_textApart = text;
+    node->_flags |= NSXMLNode::TextApart;
+  }
+  friend class NSXMLTreeBuilder;
 
   // The names of the tree and what else it may hold (XMLTreeExtra.h).
   NSXMLTreeExtra* extra() const;

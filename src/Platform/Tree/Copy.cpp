@@ -5,8 +5,6 @@
 #include "Platform/Tree/TreeBuilder.h"
 #include "xquery/XMLNode.h"
 
-#include <cstring>
-
 namespace xquery {
 
 namespace {
@@ -16,11 +14,7 @@ struct Room {
   size_t nodes = 0;
   size_t texts = 0;
   void add(const NSXMLNode* node) {
-    nodes += node->kind() == Kind::Attribute || node->kind() == Kind::Namespace ||
-                     node->kind() == Kind::Text || node->kind() == Kind::Comment
-                 ? sizeof(NSXMLNode)
-                 : sizeof(NSXMLElement);
-    texts += NSXMLTree::roomForText(node->textView());
+    NSXMLTreeBuilder::addRoom(node->kind(), node->textView(), nodes, texts);
   }
 };
 
@@ -53,7 +47,6 @@ class Copier {
  private:
   // Copies the node, and an element's properties; leaves a node that may have children open.
   void visit(const NSXMLNode* node);
-  void copyText(NSXMLNode* node, const NSXMLNode* original);
   const NSXMLName* nameOf(const NSXMLNode* original);
 
   const NSXMLNode* _root;
@@ -66,20 +59,6 @@ const NSXMLName* Copier::nameOf(const NSXMLNode* original) {
   return name;
 }
 
-void Copier::copyText(NSXMLNode* node, const NSXMLNode* original) {
-  const NSStringView text = original->textView();
-  const size_t bytes = size_t{text.length()} * (text.isWide() ? sizeof(char16_t) : 1);
-  void* units = _builder.tree().allocateText(bytes);
-  if (text.isWide()) {
-    std::memcpy(units, text.wideUnits(), bytes);
-    NSXMLTree::setStoredText(node, {static_cast<const char16_t*>(units), text.length()});
-  } else {
-    if (bytes) std::memcpy(units, text.asciiUnits(), bytes);
-    NSXMLTree::setStoredText(node, {static_cast<const char*>(units), text.length()});
-  }
-  if (NSXMLTree::isCDATA(original)) NSXMLTree::setCDATA(node);
-}
-
 void Copier::visit(const NSXMLNode* node) {
   if (const auto* document = dyn_cast<NSXMLDocument>(node)) {
     NSXMLDocument* copied = _builder.openDocument();
@@ -90,10 +69,13 @@ void Copier::visit(const NSXMLNode* node) {
     _builder.openElement(nameOf(element));
     const NSXMLNode* property = NSXMLTree::firstPropertyOf(element);
     for (; property; property = NSXMLTree::nextProperty(property)) {
-      copyText(_builder.addProperty(property->kind(), nameOf(property)), property);
+      _builder.addProperty(property->kind(), nameOf(property), property->textView());
     }
+  } else if (node->kind() == Kind::ProcessingInstruction) {
+    _builder.addInstruction(nameOf(node), node->textView());
   } else {
-    copyText(_builder.addLeaf(node->kind(), nameOf(node)), node);
+    NSXMLNode* const leaf = _builder.addLeaf(node->kind(), node->textView());
+    if (NSXMLTree::isCDATA(node)) NSXMLTree::setCDATA(leaf);
   }
 }
 

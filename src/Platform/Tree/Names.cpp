@@ -7,6 +7,7 @@
 #include "Platform/Tree/Names.h"
 
 #include "Platform/Base/KeyedHash.h"
+#include "Platform/Base/RangeMemory.h"
 #include "Platform/Tree/Credit.h"
 
 #include <algorithm>
@@ -95,11 +96,16 @@ struct NameKey {
 
 // --- tables ----------------------------------------------------------------------------------
 
+// Nodes refer to qualified names by their places in the range.
+template <class Entry>
+constexpr bool isInRange = std::is_same_v<Entry, NSXMLName>;
+
 // An entry and its text are one block.
 template <class Entry>
 Entry* allocateEntry(NSStringView text, NSStringView Entry::*textField) {
   const size_t bytes = size_t{text.length()} * (text.isWide() ? sizeof(char16_t) : 1);
-  void* memory = std::malloc(sizeof(Entry) + bytes);
+  void* memory = isInRange<Entry> ? takeRangeBlock(sizeof(Entry) + bytes).address
+                                  : std::malloc(sizeof(Entry) + bytes);
   if (!memory) throw std::bad_alloc();
   auto* entry = ::new (memory) Entry();
   void* copy = entry + 1;
@@ -274,7 +280,7 @@ void NSXMLReleaseName(const NSXMLName* name) {
 void NSXMLRemoveReferences(const NSXMLName* name, uint32_t count) {
   if (!tables().names.release(counted(name), count)) return;
   NSXMLReleaseName(name->expanded);
-  std::free(counted(name));
+  giveRangeBlock(counted(name));
 }
 
 size_t NSXMLInternedNameCount() {

@@ -100,9 +100,10 @@ int64_t NSXMLNode::index() const {
 const NSXMLName* NSXMLNode::nodeName() const {
   switch (kind()) {
     case Kind::Element:
+      return static_cast<const NSXMLElement*>(this)->_name;
     case Kind::Attribute:
     case Kind::Namespace:
-      return _name;
+      return _propertyName;
     case Kind::ProcessingInstruction:
       return NSXMLTree::targetOf(this);
     default:
@@ -148,8 +149,10 @@ Ref<NSString> NSXMLNode::URI() const {
 
 NSStringView NSXMLNode::textView() const {
   if (isBranch()) return {};
-  return (_flags & WideText) ? NSStringView(static_cast<const char16_t*>(_text), textLength())
-                             : NSStringView(static_cast<const char*>(_text), textLength());
+  if (_flags & TextApart) return *_textApart.get();
+  const void* const text = this + 1;
+  return (_flags & WideText) ? NSStringView(static_cast<const char16_t*>(text), _textLength)
+                             : NSStringView(static_cast<const char*>(text), _textLength);
 }
 
 Ref<NSString> NSXMLNode::stringValue() const {

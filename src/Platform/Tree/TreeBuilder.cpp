@@ -3,11 +3,12 @@
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Text/Blocks.h"
 
-#include <cstring>
-#include <new>
+#include <algorithm>
 
 namespace xquery {
 namespace {
+
+constexpr size_t largestTextBlock = size_t{1} << 20;
 
 NSXMLTree* lastingTree() {
   const LastingObjects lasting;
@@ -16,96 +17,119 @@ NSXMLTree* lastingTree() {
 
 }  // namespace
 
-NSXMLTreeBuilder::NSXMLTreeBuilder(size_t nodeBytes, size_t textBytes) : _tree(lastingTree()) {
-  _tree->startBulk(nodeBytes, textBytes);
-}
+NSXMLTreeBuilder::NSXMLTreeBuilder(size_t nodeBytes, size_t textBytes)
+    : _tree(lastingTree()),
+      _nextNodeBlock(std::min(nodeBytes, NSXMLTree::largestNodeBlock / 2)),
+      _nextTextBlock(std::min(textBytes, largestTextBlock / 2)) {}
 
 NSXMLTreeBuilder::~NSXMLTreeBuilder() {
   if (_tree) _tree->destroy();
 }
 
-void NSXMLTreeBuilder::number(NSXMLNode* node) {
-  // Numbers are 32 bits wide: a tree of more nodes is more than memory was given for.
-  if (_nextNumber == UINT32_MAX) throw std::bad_alloc();
-  NSXMLTree::setOrderNumber(node, _nextNumber++);
+void NSXMLTreeBuilder::refuseNode() {
+  throw std::bad_alloc();
 }
 
-void NSXMLTreeBuilder::append(NSXMLNode* child) {
-  number(child);
-  if (!_root) _root = child;
-  if (!_current) return;
-  NSXMLTree::parentOf(child) = _current;
-  if (_lastChild) {
-    NSXMLTree::nextOf(_lastChild) = child;
-    NSXMLTree::previousOf(child) = _lastChild;
-  } else {
-    NSXMLTree::firstChildOf(_current) = child;
-  }
-  _lastChild = child;
+// --- room ------------------------------------------------------------------------------------
+
+void NSXMLTreeBuilder::startNodeBlock(size_t bytes) {
+  constexpr size_t most = NSXMLTree::largestNodeBlock - sizeof(NSXMLBlock);
+  _nodeBlock = _tree->allocateBlock(std::max(_nextNodeBlock, bytes));
+  const size_t room = std::min(NSXMLTree::roomOf(_nodeBlock), most);
+  _nodeCursor = reinterpret_cast<char*>(_nodeBlock + 1);
+  _nodeEnd = _nodeCursor + room;
+  _nextNodeBlock = std::min(room * 2, most);
 }
+
+// At an even address, for texts in UTF-16.
+char* NSXMLTreeBuilder::takeTextRoom(size_t bytes) {
+  const size_t rounded = (bytes + 1) & ~size_t{1};
+  if (static_cast<size_t>(_textEnd - _textCursor) < rounded) {
+    // A text that would waste much of a block has one of its own.
+    if (rounded > _nextTextBlock / 4) {
+      return reinterpret_cast<char*>(_tree->allocateBlock(rounded) + 1);
+    }
+    NSXMLBlock* const block = _tree->allocateBlock(_nextTextBlock);
+    _textCursor = reinterpret_cast<char*>(block + 1);
+    _textEnd = _textCursor + NSXMLTree::roomOf(block);
+    _nextTextBlock = std::min(_nextTextBlock * 2, largestTextBlock);
+  }
+  char* const room = _textCursor;
+  _textCursor += rounded;
+  return room;
+}
+
+void NSXMLTreeBuilder::addRoom(Kind kind, NSStringView text, size_t& nodeBytes, size_t& textBytes) {
+  const bool isLarge = kind <= Kind::Element || kind == Kind::ProcessingInstruction;
+  const size_t bytes = bytesOf(text);
+  const bool isApart = bytes > longestTextBehind || kind == Kind::ProcessingInstruction;
+  nodeBytes += isLarge ? sizeof(NSXMLElement) : sizeof(NSXMLNode);
+  nodeBytes += isApart ? sizeof(NSStringView) : NSXMLTree::roomForText(bytes);
+  if (isApart) textBytes += (bytes + 1) & ~size_t{1};
+}
+
+// --- texts elsewhere -------------------------------------------------------------------------
+
+char16_t* NSXMLTreeBuilder::roomForUnits(size_t count) {
+  return reinterpret_cast<char16_t*>(takeTextRoom(count * sizeof(char16_t)));
+}
+
+const NSStringView* NSXMLTreeBuilder::storeFilled(NSStringView text) {
+  return ::new (takeRoom(sizeof(NSStringView))) NSStringView(text);
+}
+
+const NSStringView* NSXMLTreeBuilder::store(NSStringView text) {
+  return withUnitsOf(text, [this](auto units) {
+    using Unit = typename decltype(units)::value_type;
+    auto* const copy = reinterpret_cast<Unit*>(takeTextRoom(units.size() * sizeof(Unit)));
+    auto* to = copy;
+    inBlocks(units, [&to](auto block) {
+      if (!block.empty()) std::memcpy(to, block.data(), block.size() * sizeof(Unit));
+      to += block.size();
+    });
+    return storeFilled({copy, static_cast<uint32_t>(units.size())});
+  });
+}
+
+NSXMLNode* NSXMLTreeBuilder::addProperty(Kind kind, const NSXMLName* name,
+                                         const NSStringView* stored) {
+  auto* const property = make<NSXMLNode>(kind);
+  NSXMLTree::setTextApart(property, stored);
+  appendProperty(property, name);
+  return property;
+}
+
+NSXMLNode* NSXMLTreeBuilder::addLeaf(Kind kind, const NSStringView* stored) {
+  auto* const leaf = make<NSXMLNode>(kind);
+  NSXMLTree::setTextApart(leaf, stored);
+  append(leaf);
+  return leaf;
+}
+
+// --- nodes -----------------------------------------------------------------------------------
 
 NSXMLDocument* NSXMLTreeBuilder::openDocument() {
-  NSXMLDocument* document = _tree->makeDocument();
+  auto* const document = make<NSXMLDocument>(Kind::Document);
   append(document);
   _current = document;
   _lastChild = nullptr;
   return document;
 }
 
-NSXMLElement* NSXMLTreeBuilder::openElement(const NSXMLName* name) {
-  NSXMLElement* element = _tree->makeElement();
-  NSXMLTree::setAdoptedName(element, name);
-  append(element);
-  _current = element;
-  _lastChild = nullptr;
-  _lastProperty = nullptr;
-  return element;
+NSXMLNode* NSXMLTreeBuilder::addInstruction(const NSXMLName* target, const NSStringView* stored) {
+  auto* const instruction = make<NSXMLProcessingInstruction>(Kind::ProcessingInstruction);
+  NSXMLTree::setAdoptedName(instruction, target);
+  NSXMLTree::setTextApart(instruction, stored);
+  append(instruction);
+  return instruction;
 }
 
-NSXMLNode* NSXMLTreeBuilder::addProperty(Kind kind, const NSXMLName* name) {
-  NSXMLNode* property = _tree->makeNode(kind);
-  NSXMLTree::setAdoptedName(property, name);
-  number(property);
-  NSXMLTree::parentOf(property) = _current;
-  (_lastProperty ? NSXMLTree::nextOf(_lastProperty)
-                 : NSXMLTree::firstPropertyOf(cast<NSXMLElement>(_current))) = property;
-  _lastProperty = property;
-  return property;
-}
-
-NSXMLNode* NSXMLTreeBuilder::addLeaf(Kind kind, const NSXMLName* name) {
-  NSXMLNode* leaf = _tree->makeNode(kind);
-  if (name) NSXMLTree::setAdoptedName(leaf, name);
-  append(leaf);
-  return leaf;
-}
-
-NSStringView NSXMLTreeBuilder::addText(NSStringView text) {
-  return withUnitsOf(text, [this](auto units) -> NSStringView {
-    using Unit = typename decltype(units)::value_type;
-    auto* const copy = static_cast<Unit*>(_tree->allocateText(units.size() * sizeof(Unit)));
-    auto* to = copy;
-    inBlocks(units, [&to](auto block) {
-      if (!block.empty()) std::memcpy(to, block.data(), block.size() * sizeof(Unit));
-      to += block.size();
-    });
-    return {copy, static_cast<uint32_t>(units.size())};
-  });
-}
-
-void NSXMLTreeBuilder::close() {
-  // The first child's previous sibling field holds the last child.
-  if (NSXMLNode* first = NSXMLTree::firstChildOf(_current)) {
-    NSXMLTree::previousOf(first) = _lastChild;
-  }
-  _lastChild = _current;
-  _lastProperty = nullptr;
-  _current = _current->parent();
+NSXMLNode* NSXMLTreeBuilder::addInstruction(const NSXMLName* target, NSStringView text) {
+  return addInstruction(target, store(text));
 }
 
 NSXMLNode* NSXMLTreeBuilder::finish() {
   while (_current) close();
-  _tree->endBulk();
   _tree = nullptr;
   return _root;
 }

@@ -1,8 +1,14 @@
-// Builds a tree in document order: nodes come from large blocks and get their order numbers as they
-// arrive. Parsing and copying are its users.
+// Builds a tree in document order: nodes come from large blocks, one behind the other and each with
+// its text, and get their order numbers as they arrive. Parsing and copying are its users.
+//
+// A long text lies in a block of texts and the node refers to it, so that a walk over the nodes
+// does not have to pass it.
 #pragma once
 
 #include "Platform/Tree/Arena.h"
+
+#include <cstring>
+#include <new>
 
 namespace xquery {
 
@@ -17,15 +23,27 @@ class NSXMLTreeBuilder {
 
   NSXMLTree& tree() { return *_tree; }
 
-  // The first node becomes the root. Names must have been adopted by the tree.
+  // The first node becomes the root. Names must have been adopted by the tree. Texts are copied, in
+  // the width that they have.
   NSXMLDocument* openDocument();
   NSXMLElement* openElement(const NSXMLName* name);
   // Namespaces and then attributes, before the element's children.
-  NSXMLNode* addProperty(Kind kind, const NSXMLName* name);
-  NSXMLNode* addLeaf(Kind kind, const NSXMLName* name = nullptr);
-  // A copy of the text in the tree, in the width that it has, for `setStoredText`.
-  NSStringView addText(NSStringView text);
+  NSXMLNode* addProperty(Kind kind, const NSXMLName* name, NSStringView text);
+  NSXMLNode* addLeaf(Kind kind, NSStringView text);  // a text or a comment
+  NSXMLNode* addInstruction(const NSXMLName* target, NSStringView text);
   void close();
+
+  // The same with a text that is in the tree already, and may be that of several nodes.
+  NSXMLNode* addProperty(Kind kind, const NSXMLName* name, const NSStringView* stored);
+  NSXMLNode* addLeaf(Kind kind, const NSStringView* stored);
+  NSXMLNode* addInstruction(const NSXMLName* target, const NSStringView* stored);
+  const NSStringView* store(NSStringView text);
+  // Room for so many units of a text, for the caller to fill.
+  char16_t* roomForUnits(size_t count);
+  const NSStringView* storeFilled(NSStringView text);
+
+  // What a node of the kind and its text take of nodes and of texts.
+  static void addRoom(Kind kind, NSStringView text, size_t& nodeBytes, size_t& textBytes);
 
   // The open element or document; null before the first and after the last.
   NSXMLNode* current() const { return _current; }
@@ -33,8 +51,43 @@ class NSXMLTreeBuilder {
   [[nodiscard]] NSXMLNode* finish();
 
  private:
-  void number(NSXMLNode* node);
+  // Most texts are shorter.
+  static constexpr size_t longestTextBehind = 128;
+
+  static size_t bytesOf(NSStringView text) {
+    return size_t{text.length()} << static_cast<int>(text.isWide());
+  }
+  static const char* unitsOf(NSStringView text) {
+    return text.isWide() ? reinterpret_cast<const char*>(text.wideUnits()) : text.asciiUnits();
+  }
+  static void copyShort(char* to, const char* from, size_t bytes);
+  [[noreturn]] static void refuseNode();
+
+  char* takeRoom(size_t bytes) {
+    if (static_cast<size_t>(_nodeEnd - _nodeCursor) < bytes) [[unlikely]] {
+      startNodeBlock(bytes);
+    }
+    char* const room = _nodeCursor;
+    _nodeCursor += bytes;
+    return room;
+  }
+  void startNodeBlock(size_t bytes);
+  char* takeTextRoom(size_t bytes);
+
+  template <class Node>
+  Node* make(Kind kind, size_t textBytes = 0) {
+    char* const room = takeRoom(sizeof(Node) + textBytes);  // may start a block
+    Node* const node = NSXMLTree::placeNode<Node>(_nodeBlock, room, kind);
+    // Numbers are 32 bits wide: a tree of more nodes is more than memory was given for.
+    if (_nextNumber == UINT32_MAX) [[unlikely]] {
+      refuseNode();
+    }
+    NSXMLTree::setOrderNumber(node, _nextNumber++);
+    return node;
+  }
+  NSXMLNode* makeWithText(Kind kind, NSStringView text);
   void append(NSXMLNode* child);
+  void appendProperty(NSXMLNode* property, const NSXMLName* name);
 
   NSXMLTree* _tree;
   NSXMLNode* _root = nullptr;
@@ -42,6 +95,102 @@ class NSXMLTreeBuilder {
   NSXMLNode* _lastChild = nullptr;     // of the current node
   NSXMLNode* _lastProperty = nullptr;  // of the current element
   uint32_t _nextNumber = NSXMLTree::firstOrderNumber;
+  // Where the next node and its text go, and the next long text.
+  NSXMLBlock* _nodeBlock = nullptr;
+  char* _nodeCursor = nullptr;
+  char* _nodeEnd = nullptr;
+  char* _textCursor = nullptr;
+  char* _textEnd = nullptr;
+  size_t _nextNodeBlock;
+  size_t _nextTextBlock;
 };
+
+// --- how ---------------------------------------------------------------------------------------
+
+inline void NSXMLTreeBuilder::append(NSXMLNode* child) {
+  if (!_current) {
+    if (!_root) _root = child;
+    return;
+  }
+  NSXMLTree::parentOf(child) = _current;
+  if (_lastChild) {
+    NSXMLTree::nextOf(_lastChild) = child;
+    NSXMLTree::previousOf(child) = _lastChild;
+  } else {
+    NSXMLTree::firstChildOf(_current) = child;
+  }
+  _lastChild = child;
+}
+
+inline NSXMLElement* NSXMLTreeBuilder::openElement(const NSXMLName* name) {
+  auto* const element = make<NSXMLElement>(Kind::Element);
+  NSXMLTree::nameOf(element) = name;
+  append(element);
+  _current = element;
+  _lastChild = nullptr;
+  _lastProperty = nullptr;
+  return element;
+}
+
+// Texts are short, and a call of memcpy costs more than copying them.
+inline void NSXMLTreeBuilder::copyShort(char* to, const char* from, size_t bytes) {
+  if (bytes > 32) {
+    std::memcpy(to, from, bytes);
+  } else if (bytes >= 8) {
+    const size_t last = bytes - 8;
+    for (size_t at = 0; at < last; at += 8) std::memcpy(to + at, from + at, 8);
+    std::memcpy(to + last, from + last, 8);
+  } else if (bytes >= 4) {
+    std::memcpy(to, from, 4);
+    std::memcpy(to + bytes - 4, from + bytes - 4, 4);
+  } else {
+    for (size_t at = 0; at < bytes; ++at) to[at] = from[at];
+  }
+}
+
+inline NSXMLNode* NSXMLTreeBuilder::makeWithText(Kind kind, NSStringView text) {
+  const size_t bytes = bytesOf(text);
+  if (bytes > longestTextBehind) [[unlikely]] {
+    const NSStringView* const stored = store(text);
+    auto* const node = make<NSXMLNode>(kind);
+    NSXMLTree::setTextApart(node, stored);
+    return node;
+  }
+  auto* const node = make<NSXMLNode>(kind, NSXMLTree::roomForText(bytes));
+  copyShort(reinterpret_cast<char*>(node + 1), unitsOf(text), bytes);
+  NSXMLTree::noteTextBehind(node, text);
+  return node;
+}
+
+inline void NSXMLTreeBuilder::appendProperty(NSXMLNode* property, const NSXMLName* name) {
+  NSXMLTree::propertyNameOf(property) = name;
+  NSXMLTree::parentOf(property) = _current;
+  (_lastProperty ? NSXMLTree::nextOf(_lastProperty)
+                 : NSXMLTree::firstPropertyOf(static_cast<NSXMLElement*>(_current))) = property;
+  _lastProperty = property;
+}
+
+inline NSXMLNode* NSXMLTreeBuilder::addProperty(Kind kind, const NSXMLName* name,
+                                                NSStringView text) {
+  NSXMLNode* const property = makeWithText(kind, text);
+  appendProperty(property, name);
+  return property;
+}
+
+inline NSXMLNode* NSXMLTreeBuilder::addLeaf(Kind kind, NSStringView text) {
+  NSXMLNode* const leaf = makeWithText(kind, text);
+  append(leaf);
+  return leaf;
+}
+
+inline void NSXMLTreeBuilder::close() {
+  // The first child's previous sibling field holds the last child.
+  if (NSXMLNode* const first = NSXMLTree::firstChildOf(_current)) {
+    NSXMLTree::previousOf(first) = _lastChild;
+  }
+  _lastChild = _current;
+  _lastProperty = nullptr;
+  _current = _current->parent();
+}
 
 }  // namespace xquery

@@ -40,16 +40,6 @@ struct NSXMLTreeExtra {
   // that they count like its nodes.
   void insert(const NSXMLName* name);
 
-  // Where the next node and text of a tree that grows in bulk go.
-  bool isBulk = false;
-  char* nodeBlock = nullptr;
-  char* nodeCursor = nullptr;
-  char* nodeEnd = nullptr;
-  char* textCursor = nullptr;
-  char* textEnd = nullptr;
-  size_t nextNodeBlock = 0;
-  size_t nextTextBlock = 0;
-
   NSXMLNameSet names;
   std::vector<NSXMLDocument*> documents;  // those with a URI
 

@@ -26,8 +26,8 @@ class ReadNamesTest : public testing::Test {
   void declare(std::string_view attribute, std::string_view URI, size_t depth) {
     ReadName& name = named(attribute);
     ASSERT_TRUE(name.declares);
-    names.declare(*name.declares, URI, depth, [](std::string_view text) {
-      return NSStringView::ascii(text);  // literals stay
+    names.declare(*name.declares, URI, depth, [this](std::string_view text) {
+      return _builder.store(NSStringView::ascii(text));
     });
   }
   std::string URIOf(const NSXMLName* name) { return NSXMLURIOf(*name->expanded).utf8(); }
