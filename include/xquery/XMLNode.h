@@ -435,6 +435,8 @@ class XQUERY_EXPORT NSXMLExpandedNameRef {
   NSXMLExpandedNameRef() = default;
   // An empty URI is no namespace.
   NSXMLExpandedNameRef(NSStringView URI, NSStringView localName);
+  // Another handle to a name that somebody has one to, or a node carries.
+  explicit NSXMLExpandedNameRef(const NSXMLExpandedName* name);
   NSXMLExpandedNameRef(const NSXMLExpandedNameRef& other);
   NSXMLExpandedNameRef(NSXMLExpandedNameRef&& other) noexcept;
   NSXMLExpandedNameRef& operator=(NSXMLExpandedNameRef other) noexcept;

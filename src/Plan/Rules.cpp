@@ -39,6 +39,9 @@ constexpr std::array rules = {
     XQueryRule{"constructors",
                "what is constructed for another node is made in the tree of that one",
                XQueryBuildInPlace},
+    // Behind what replaces probes, which looking up evaluates.
+    XQueryRule{"values", "elements with a value are found in the index of the tree",
+               XQueryLookUpValues},
     // Behind what replaces keys and probes, which joins evaluate.
     XQueryRule{"for-joins", "the where clause picks items of the for clauses by their keys",
                XQueryJoinForClauses},

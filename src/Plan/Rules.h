@@ -42,5 +42,6 @@ void XQueryShortenPaths(XQueryPlanning& planning);
 void XQueryAnswerQuickly(XQueryPlanning& planning);
 void XQueryBuildInPlace(XQueryPlanning& planning);
 void XQueryJoinConditions(XQueryPlanning& planning);
+void XQueryLookUpValues(XQueryPlanning& planning);
 
 }  // namespace xquery

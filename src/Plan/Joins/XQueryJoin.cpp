@@ -3,6 +3,7 @@
 #include "Context/KeptValues.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Operators/XQueryTentative.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "xquery/Number.h"
@@ -13,23 +14,6 @@
 
 namespace xquery {
 namespace {
-
-// Evaluates what the plain way may not have come to evaluate yet, and may never: null for an error,
-// which leaves nothing behind. That goes for limits as well, such as a range of too many items; one
-// that ends the whole evaluation is reached again at the next look at the work.
-Value valueOrNull(const XQueryExpr& expr, XQueryContext& context) {
-  auto& dynamic = context._internal();
-  const Value item = dynamic.contextItem();
-  const int64_t position = dynamic.position();
-  const int64_t last = dynamic.last();
-  const Ref<XQueryError> error = dynamic.error();
-  Value value = expr.evaluateWithContext(context);
-  if (!XQueryHasFailed(value, context)) return value;
-  dynamic.passOverFailure(error);
-  dynamic.setContextItem(item, position);
-  dynamic.setLast(last);
-  return {};
-}
 
 // Where it has to be known for every round.
 bool isBrieflySettledAround(const Value& value) {
@@ -56,7 +40,7 @@ enum class Truth : uint8_t { No, Yes, Failure };
 // What the conditions, joined by "and", come to.
 Truth truthOf(const std::vector<Ref<XQueryExpr>>& conditions, XQueryContext& context) {
   for (const auto& condition : conditions) {
-    const Value value = valueOrNull(*condition, context);
+    const Value value = XQueryValueOrNull(*condition, context);
     if (!value) return Truth::Failure;
     if (!XQueryIsTrue(XQueryEffectiveBooleanValue(value, context))) return Truth::No;
   }
@@ -65,7 +49,7 @@ Truth truthOf(const std::vector<Ref<XQueryExpr>>& conditions, XQueryContext& con
 
 bool anyFails(const std::vector<Ref<XQueryExpr>>& exprs, XQueryContext& context) {
   return std::any_of(exprs.begin(), exprs.end(),
-                     [&](const auto& expr) { return !valueOrNull(*expr, context); });
+                     [&](const auto& expr) { return !XQueryValueOrNull(*expr, context); });
 }
 
 }  // namespace
@@ -214,13 +198,13 @@ Value XQueryJoin::keyOf(const Value& item, size_t position, size_t term,
   Value key;
   for (const XQueryJoinTerm& each : _condition.terms) {
     if (!each.mustNotFail) continue;
-    Value read = valueOrNull(*each.key, context);
+    Value read = XQueryValueOrNull(*each.key, context);
     if (!read) return {};
     if (&each == &_condition.terms[term]) key = std::move(read);
   }
   switch (truthOf(_condition.filters, context)) {
     case Truth::Yes:
-      return key ? key : valueOrNull(*_condition.terms[term].key, context);
+      return key ? key : XQueryValueOrNull(*_condition.terms[term].key, context);
     case Truth::No:  // as an item without a key, it meets nothing
       return Value(NSNull::null());
     default:
@@ -243,7 +227,7 @@ bool XQueryJoin::askEach(const Tables& tables, bool withProbes, XQueryContext& c
       continue;
     }
     static const Value nothing = NSNull::null();
-    Value probe = withProbes || term.mustNotFail ? valueOrNull(*term.probe, context) : nothing;
+    Value probe = withProbes || term.mustNotFail ? XQueryValueOrNull(*term.probe, context) : nothing;
     if (!probe && term.mustNotFail) return false;
     auto question = table ? table->questionOf(withProbes ? probe : nothing) : std::nullopt;
     const bool answers = question && table->isRegularFor(*question);

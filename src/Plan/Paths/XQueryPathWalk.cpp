@@ -166,11 +166,29 @@ void XQueryPathWalk::takeCountedBelow(size_t index, NSXMLNode* node) {
 
 void XQueryPathWalk::take(size_t index, int axis, NSXMLNode* node) {
   const XQueryWalkedStep& step = _steps[index];
+  if (step.lookup && takeLookedUp(index, axis, node)) return;
   if (!step.hasPredicates() || filtersEach(step)) {
     stream(index, axis, node);
   } else {
     filter(index, axis, node);
   }
+}
+
+// False where the step has to walk.
+bool XQueryPathWalk::takeLookedUp(size_t index, int axis, NSXMLNode* node) {
+  const XQueryWalkedStep& step = _steps[index];
+  const bool isOpen = axis == XQueryAxisChild || axis == XQueryAxisDescendant;
+  if (!isOpen || listingStep || setsEveryFocus) return false;
+  if (XQueryStepTest(step, *this).onlyName() != step.lookup->element()) return false;
+  std::vector<NSXMLNode*>& nodes = openNodeList();
+  const bool areFound = step.lookup->find(node, axis, context, nodes);
+  if (areFound && filterNodes(step, step.predicatesInTest, nodes)) {
+    takeNodes(index + 1, nodes);
+  } else {
+    hasFailed = hasFailed || areFound;
+  }
+  closeNodeList();
+  return areFound;
 }
 
 // Whether it is of use to ask the predicates before all nodes are found, and nobody can tell.
@@ -252,9 +270,11 @@ template <class VisitOf>
 void XQueryPathWalk::streamMatching(size_t index, int axis, NSXMLNode* node, VisitOf visitOf) {
   const XQueryWalkedStep& step = _steps[index];
   const bool isLast = index + 1 == _steps.size();
-  const auto handOn = [this, &step, isLast, index](NSXMLNode* found) {
+  size_t asked = 0;
+  const auto handOn = [this, &step, isLast, index, &asked](NSXMLNode* found) {
     // A trail may go on after the end.
     if (isOver()) return false;
+    ++asked;
     if (step.hasPredicates() && !keepsAlone(step, step.predicatesInTest, found)) return !hasFailed;
     if (isLast) {
       results.addNode(found, context);
@@ -279,6 +299,7 @@ void XQueryPathWalk::streamMatching(size_t index, int axis, NSXMLNode* node, Vis
   } else {
     XQueryWalkAnyAxis(node, axis, false, visitOf(handOn));
   }
+  if (step.lookup) step.lookup->noteAsked(node, asked);
   if (isLast) results.setIsReversed(step.isReverse());
 }
 
@@ -287,6 +308,7 @@ void XQueryPathWalk::filter(size_t index, int axis, NSXMLNode* node) {
   const XQueryWalkedStep& step = _steps[index];
   std::vector<NSXMLNode*>& nodes = openNodeList();
   const size_t predicatesDone = collect(step, axis, node, nodes);
+  if (step.lookup) step.lookup->noteAsked(node, nodes.size());
   if (listingStep == &step) {
     listed->insert(listed->end(), nodes.begin(), nodes.end());
   } else if (filterNodes(step, predicatesDone, nodes)) {

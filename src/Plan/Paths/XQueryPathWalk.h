@@ -1,6 +1,6 @@
 // One walk along the steps of a path.
 //
-// Steps are taken node by node, as the path itself takes them, with three shortcuts. They rest on
+// Steps are taken node by node, as the path itself takes them, with five shortcuts. They rest on
 // steps that can be repeated: axis steps whose tests cannot raise an error and whose predicates
 // answer the same for the same focus and do nothing else (an error in a predicate only drops its
 // item). What a chain of such steps yields from a node is always the same, nobody can tell when or
@@ -21,6 +21,8 @@
 //                 sorted. "//@a" is the same.
 //   countsBelow   "//a[2]" is the same where it begins the path and starts from one node: the
 //                 descendants named a are counted by their parents, which come in document order.
+//   lookup        Where a predicate asks for a value that the index of the tree has, the step takes
+//                 the nodes with that value in place of walking (XQueryValueLookup).
 //   filtersEach   Where only some of the nodes are wanted, or their number, a step filters each
 //                 node as it finds it and hands it on, so that the walk ends as soon as the answer
 //                 is certain.
@@ -75,6 +77,7 @@ class XQueryPathWalk : public XQueryPathRun {
   void takeItem(size_t index, NSObject* item, int64_t position, bool validate);
   void take(size_t index, int axis, NSXMLNode* node);
   void takeCountedBelow(size_t index, NSXMLNode* node);
+  bool takeLookedUp(size_t index, int axis, NSXMLNode* node);
   void stream(size_t index, int axis, NSXMLNode* node);
   template <class VisitOf>
   void streamMatching(size_t index, int axis, NSXMLNode* node, VisitOf visitOf);

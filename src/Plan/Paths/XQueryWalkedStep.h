@@ -5,6 +5,7 @@
 #include "Expr/Paths/XQueryPath.h"
 #include "Expr/Paths/XQueryPathRun.h"
 #include "Plan/Paths/XQueryNameChoice.h"
+#include "Plan/Paths/XQueryValueLookup.h"
 
 #include <cstddef>
 #include <memory>
@@ -64,6 +65,8 @@ struct XQueryWalkedStep {
   Ref<XQueryExpr> ownTest;
   std::unique_ptr<const XQueryNameChoice> choice;  // null for none
   size_t predicatesInTest = 0;
+  // Of what the step finds, nothing but its candidates is wanted; null for none.
+  std::unique_ptr<const XQueryValueLookup> lookup;
 
   // See XQueryPathWalk.h.
   bool absorbsNext = false;

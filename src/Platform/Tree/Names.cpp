@@ -328,9 +328,12 @@ void NSXMLNameSet::grow() {
 NSXMLExpandedNameRef::NSXMLExpandedNameRef(NSStringView URI, NSStringView localName)
     : _name(NSXMLInternExpandedName(localName, URI)) {}
 
-NSXMLExpandedNameRef::NSXMLExpandedNameRef(const NSXMLExpandedNameRef& other) : _name(other._name) {
+NSXMLExpandedNameRef::NSXMLExpandedNameRef(const NSXMLExpandedName* name) : _name(name) {
   if (_name) NSXMLRetainName(_name);
 }
+
+NSXMLExpandedNameRef::NSXMLExpandedNameRef(const NSXMLExpandedNameRef& other)
+    : NSXMLExpandedNameRef(other._name) {}
 
 NSXMLExpandedNameRef::NSXMLExpandedNameRef(NSXMLExpandedNameRef&& other) noexcept
     : _name(std::exchange(other._name, nullptr)) {}

@@ -136,6 +136,12 @@ const NSXMLValueIndex* NSXMLTreeIndexes::values(const NSXMLValueKey& key, uint64
                   [&] { return NSXMLValueIndex::make(elements, key); });
 }
 
+void NSXMLTreeIndexes::addWork(const NSXMLValueKey& key, uint64_t work) {
+  if (KeyPlace* const place = placeOf(key)) {
+    place->workDone.fetch_add(work, std::memory_order_relaxed);
+  }
+}
+
 NSXMLTreeIndexes::KeyPlace* NSXMLTreeIndexes::placeOf(const NSXMLValueKey& key) {
   const auto present = [&]() -> KeyPlace* {
     KeyPlace* place = _keys.load(std::memory_order_acquire);
@@ -196,6 +202,20 @@ std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLNameSelection& 
   NSXMLIndexedNodes found{std::move(walk.indexes), {}, elements->nodes(names, first, stop)};
   found.nodes = found.merged;
   return found;
+}
+
+NSXMLIndexedValues NSXMLIndexedValues::of(const NSXMLValueKey& key, const NSXMLNode* first,
+                                          const NSXMLNode* stop) {
+  IndexesForWalk walk = indexesForWalk(first, stop);
+  const NSXMLValueIndex* const values = walk.indexes ? walk.indexes->values(key, 0) : nullptr;
+  return {std::move(walk.indexes), values};
+}
+
+void NSXMLNoteAskedValues(const NSXMLValueKey& key, uint64_t elements, const NSXMLNode* node) {
+  constexpr uint64_t nodesPerElement = 16;
+  if (NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(node)) {
+    indexes->addWork(key, elements * nodesPerElement);
+  }
 }
 
 std::optional<NSXMLIndexedNodes> NSXMLIndexedAttributes(const NSXMLExpandedName* name,

@@ -73,6 +73,8 @@ class NSXMLTreeIndexes {
   const NSXMLNameIndex* attributes(uint64_t work);
   // `work` includes the way from each element to its values.
   const NSXMLValueIndex* values(const NSXMLValueKey& key, uint64_t work);
+  // What such a walk has come to, where it is not known before.
+  void addWork(const NSXMLValueKey& key, uint64_t work);
 
   // Of the last node.
   uint32_t lastNumber() const { return _lastNumber; }
@@ -137,6 +139,18 @@ struct NSXMLIndexedNodes {
                                                                     bool withInstructions,
                                                                     const NSXMLNode* first,
                                                                     const NSXMLNode* stop);
+// The elements of the name in the key from `first` on before `stop` by their values; null for:
+// walk.
+struct NSXMLIndexedValues {
+  NSXMLIndexesRef indexes;
+  const NSXMLValueIndex* values = nullptr;
+
+  [[nodiscard]] static NSXMLIndexedValues of(const NSXMLValueKey& key, const NSXMLNode* first,
+                                             const NSXMLNode* stop);
+};
+// For: walk, after which it is told how many elements were asked for their values there. These lie
+// anywhere, and their values somewhere else, so that each takes as long as many nodes in a row.
+void NSXMLNoteAskedValues(const NSXMLValueKey& key, uint64_t elements, const NSXMLNode* node);
 // The attributes of the name of the elements from `first` on before `stop`.
 [[nodiscard]] std::optional<NSXMLIndexedNodes> NSXMLIndexedAttributes(const NSXMLExpandedName* name,
                                                                       const NSXMLNode* first,
