@@ -2,6 +2,7 @@
 
 #include "Messages.h"
 #include "Output.h"
+#include "Progress.h"
 #include "Streams.h"
 #include "Timing.h"
 #include "xquery/xquery.h"
@@ -61,9 +62,14 @@ Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path,
   NSXMLParseError error;
   uint32_t mode = options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
   if (markup == Markup::HTML) mode |= NSXMLDocumentTidyHTML;
-  Ref<NSXMLDocument> document = NSXMLDocument::documentWithFile(path, mode, &error);
-  if (document) return document;
   const std::string name = path == "-" ? "standard input" : path;
+  Ref<NSXMLDocument> document;
+  {
+    ProgressLine line(visible(name));
+    document = NSXMLDocument::documentWithFile(
+        path, mode, &error, [&line](uint64_t bytes, uint64_t whole) { line.show(bytes, whole); });
+  }
+  if (document) return document;
   if (error.line == 0) {
     // The reason why a file cannot be read begins with its path.
     const size_t named = error.message.starts_with(path + ": ") ? path.size() + 2 : 0;

@@ -140,6 +140,11 @@ struct NSXMLBlock {
 
 static_assert(sizeof(NSXMLBlock) == 16);
 
+// Told how many bytes of a file have been read so far, after each piece of at most a few hundred
+// kilobytes, and how many the file has; that is 0 for what has no size, as a pipe. Some texts are
+// read again from their beginning. Called on the thread that reads; must not throw.
+using NSXMLReadingProgress = std::function<void(uint64_t bytes, uint64_t whole)>;
+
 // A node of any kind. To walk a tree:
 //
 //   for (const NSXMLNode* node = root; node; node = node->nextNode()) ...
@@ -379,9 +384,10 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
   [[nodiscard]] static Ref<NSXMLDocument> documentWithData(std::string_view bytes, uint32_t options,
                                                            NSXMLParseError* error = nullptr);
   // Reads the file in pieces (`-` is standard input). `error->line` is 0 when it cannot be read.
-  [[nodiscard]] static Ref<NSXMLDocument> documentWithFile(const std::string& path,
-                                                           uint32_t options,
-                                                           NSXMLParseError* error = nullptr);
+  // `progress` may be empty.
+  [[nodiscard]] static Ref<NSXMLDocument> documentWithFile(
+      const std::string& path, uint32_t options, NSXMLParseError* error = nullptr,
+      const NSXMLReadingProgress& progress = {});
 
   NSXMLElement* rootElement() const;  // the first element child
 

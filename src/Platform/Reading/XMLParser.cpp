@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <cstring>
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 #include <vector>
 
@@ -47,13 +48,21 @@ class InputFile {
   InputFile& operator=(const InputFile&) = delete;
 
   bool isOpen() const { return _descriptor >= 0; }
-  ptrdiff_t read(char* buffer, size_t size) {
+  ptrdiff_t read(char* buffer, size_t size, const NSXMLReadingProgress& progress) {
     ptrdiff_t count = 0;
     do {
       count = ::read(_descriptor, buffer, size);
     } while (count < 0 && errno == EINTR);
     if (count < 0) _failure = errno;
+    if (count > 0) _bytesRead += static_cast<uint64_t>(count);
+    if (count > 0 && progress) progress(_bytesRead, bytesInFile());
     return count;
+  }
+  // 0 for what has none.
+  uint64_t bytesInFile() const {
+    struct stat about;
+    const bool isFile = ::fstat(_descriptor, &about) == 0 && S_ISREG(about.st_mode);
+    return isFile ? static_cast<uint64_t>(about.st_size) : 0;
   }
   int failure() const { return _failure; }
   // Whether it has a beginning to go back to, as files have and pipes have not.
@@ -61,12 +70,14 @@ class InputFile {
   bool rewind() {
     const bool isThere = ::lseek(_descriptor, 0, SEEK_SET) == 0;
     if (!isThere) _failure = errno;
+    _bytesRead = 0;
     return isThere;
   }
 
  private:
   int _descriptor;
   int _failure = 0;
+  uint64_t _bytesRead = 0;
 };
 
 Ref<NSXMLDocument> unreadable(const std::string& path, int failure, NSXMLParseError& error) {
@@ -94,12 +105,15 @@ Ref<NSXMLDocument> NSXMLDocument::documentWithData(std::string_view bytes, uint3
 }
 
 Ref<NSXMLDocument> NSXMLDocument::documentWithFile(const std::string& path, uint32_t options,
-                                                   NSXMLParseError* error) {
+                                                   NSXMLParseError* error,
+                                                   const NSXMLReadingProgress& progress) {
   NSXMLParseError ignored;
   NSXMLParseError& reported = error ? *error : ignored;
   InputFile file(path);
   if (!file.isOpen()) return unreadable(path, errno, reported);
-  const TextInput read = [&](char* buffer, size_t size) { return file.read(buffer, size); };
+  const TextInput read = [&](char* buffer, size_t size) {
+    return file.read(buffer, size, progress);
+  };
   if (options & NSXMLDocumentTidyHTML) {
     const std::string bytes = readAll(read);
     if (file.failure()) return unreadable(path, file.failure(), reported);

@@ -176,6 +176,29 @@ TEST(XMLParser, AFileIsReadInPieces) {
   EXPECT_EQ(described(document.get()), described(parsed(text).get()));
 }
 
+TEST(XMLParser, AHostIsToldHowMuchOfAFileHasBeenRead) {
+  // The second text is left to libxml2, which begins again.
+  for (const std::string_view declaration : {"", "<!DOCTYPE a [<!ENTITY e 'x'>]>"}) {
+    const std::string text = std::string(declaration) + "<a>" + std::string(2000000, 'x') + "</a>";
+    const TestFolder folder;
+    folder.write("a.xml", text);
+    uint64_t last = 0;
+    int pieces = 0, beginnings = 0;
+    const auto document = NSXMLDocument::documentWithFile(folder.path("a.xml"), 0, nullptr,
+                                                          [&](uint64_t bytes, uint64_t whole) {
+                                                            EXPECT_EQ(whole, text.size());
+                                                            if (bytes <= last || last == 0)
+                                                              ++beginnings;
+                                                            last = bytes;
+                                                            ++pieces;
+                                                          });
+    ASSERT_TRUE(document);
+    EXPECT_EQ(last, text.size());
+    EXPECT_GE(pieces, 4);
+    EXPECT_EQ(beginnings, declaration.empty() ? 1 : 2);
+  }
+}
+
 TEST(XMLParser, AFileThatCannotBeReadIsAnErrorWithoutALine) {
   NSXMLParseError error;
   EXPECT_FALSE(NSXMLDocument::documentWithFile("/nowhere/at/all.xml", 0, &error));
