@@ -1,5 +1,5 @@
-// xquery_bench [--factor=F] [--scaling | --functions | --threads] [Google Benchmark options]
-// xquery_bench [--factor=F] --phrasings [--limit=SECONDS] [--ideas=TEXT]
+// xquery_bench [--factor=F] [--scaling | --functions | --threads | --reading] [Google Benchmark
+// options] xquery_bench [--factor=F] --phrasings [--limit=SECONDS] [--ideas=TEXT]
 //
 // Measures the tree build, single steps (some with the memory that each takes at the peak), a table
 // of paths, each beside the peer's figure from the same run, and the twenty numbered queries of
@@ -13,6 +13,7 @@
 #include "Peer.h"
 #include "Phrasings.h"
 #include "Queries.h"
+#include "Reading.h"
 #include "Scaling.h"
 #include "Threads.h"
 
@@ -21,12 +22,10 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <malloc.h>
 #include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
-#include <unistd.h>
 #include <vector>
 
 namespace {
@@ -109,25 +108,15 @@ constexpr StepRow stepRows[] = {
     {"item", "for $x in 1 to 10000000 return $x", 1e7, true},
 };
 
-double residentBytes() {
-  malloc_trim(0);
-  long total = 0, resident = 0;
-  if (FILE* file = std::fopen("/proc/self/statm", "r")) {
-    if (std::fscanf(file, "%ld %ld", &total, &resident) != 2) resident = 0;
-    std::fclose(file);
-  }
-  return static_cast<double>(resident) * static_cast<double>(sysconf(_SC_PAGESIZE));
-}
-
 // Builds both trees, noting what each takes in memory.
 void prepare(double factor) {
   inputs.xml = bench::auctionData(factor);
   const auto size = static_cast<double>(inputs.xml.size());
-  const double before = residentBytes();
+  const double before = bench::residentBytes();
   inputs.document = bench::parse(inputs.xml);
-  const double between = residentBytes();
+  const double between = bench::residentBytes();
   inputs.peer = std::make_unique<bench::PeerDocument>(inputs.xml);
-  const double after = residentBytes();
+  const double after = bench::residentBytes();
   for (const NSXMLNode* node = inputs.document.get(); node; node = node->nextNode()) inputs.nodes++;
   std::printf("document: %.1f MB, %.0f nodes\n", size / 1e6, inputs.nodes);
   std::printf("memory: %.2f bytes per byte of document; peer %.2f\n", (between - before) / size,
@@ -231,7 +220,7 @@ void registerAll() {
 
 struct Options {
   bench::PhrasingOptions measured;  // the factor is everybody's
-  bool scaling = false, phrasings = false;
+  bool scaling = false, phrasings = false, reading = false;
 };
 
 // Leaves `value` as it is when the text is no number within the bounds.
@@ -258,6 +247,8 @@ std::optional<Options> takeOptions(int& argc, char** argv) {
       options.measured.ideas = argument.substr(8);
     } else if (argument == "--scaling") {
       options.scaling = true;
+    } else if (argument == "--reading") {
+      options.reading = true;
     } else if (argument == "--phrasings") {
       options.phrasings = true;
     } else {
@@ -281,6 +272,7 @@ int main(int argc, char** argv) {
     return 2;
   }
   if (options->scaling) return bench::reportScaling();
+  if (options->reading) return bench::reportReading(options->measured.factor);
   if (options->phrasings) return bench::reportPhrasings(options->measured);
   benchmark::Initialize(&argc, argv);
   if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 2;

@@ -7,6 +7,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <malloc.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -41,6 +42,11 @@ void startPeak() {
 }
 
 }  // namespace
+
+double residentBytes() {
+  malloc_trim(0);
+  return statusBytes("VmRSS:");
+}
 
 int reportPeak(const char* text) {
   const auto query = compile(text);
