@@ -146,7 +146,7 @@ void RangeRuns::giveBack(char* begin, char* end) {
 
 void RangeRuns::giveBackIdle() noexcept {
   const std::lock_guard guard(*this);
-  releaseKept();
+  releaseIdle();
   for (FreeRun* first : _bins) {
     for (FreeRun* run = first; run; run = run->next) {
       giveBack(reinterpret_cast<char*>(run + 1), run->after()->address());
@@ -266,8 +266,7 @@ RangeRuns::Run* RangeRuns::takeRun(size_t units) {
   }
   if (Run* const run = takeFree(units)) return run;
   if (Run* const run = takeTop(units)) return run;
-  if (_keptCount == 0) return nullptr;
-  releaseKept();
+  releaseIdle();
   Run* const run = takeFree(units);
   return run ? run : takeTop(units);
 }
@@ -341,9 +340,12 @@ void RangeRuns::release(Run* run) {
   link(run);
 }
 
-void RangeRuns::releaseKept() {
+void RangeRuns::releaseIdle() {
   for (size_t at = 0; at < _keptCount; ++at) release(_kept[at]);
   _keptCount = _keptBytes = 0;
+  for (Run*& waiting : _waiting) {
+    if (Run* const run = std::exchange(waiting, nullptr)) release(run);
+  }
 }
 
 void RangeRuns::keep(Run* run) {
@@ -369,16 +371,16 @@ void RangeRuns::keep(Run* run) {
 
 void RangeRuns::give(Run* run) {
   forbid(run->block(), bytesOf(run->units()));
+  if (run->units() * unit >= largeBytes) {
+    keep(run);
+    return;
+  }
   if (isSanitized) {
     std::swap(run, _waiting[_nextWaiting]);
     _nextWaiting = (_nextWaiting + 1) % _waiting.size();
     if (!run) return;
   }
-  if (run->units() * unit >= largeBytes) {
-    keep(run);
-  } else {
-    release(run);
-  }
+  release(run);
 }
 
 void RangeRuns::give(void* block) noexcept {

@@ -115,7 +115,7 @@ class RangeRuns {
   void give(Run* run);
   void keep(Run* run);
   void release(Run* run);
-  void releaseKept();
+  void releaseIdle();
   void giveBack(char* begin, char* end);
 
   std::mutex _mutex;
@@ -130,7 +130,7 @@ class RangeRuns {
   std::array<Run*, 64> _kept = {};
   size_t _keptCount = 0;
   size_t _keptBytes = 0;
-  // Under AddressSanitizer: what was given back last.
+  // Under AddressSanitizer: the smaller blocks that were given back last.
   std::array<Run*, 256> _waiting = {};
   size_t _nextWaiting = 0;
 };
