@@ -10,6 +10,7 @@
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <optional>
 #include <vector>
 
 namespace xquery {
@@ -25,8 +26,12 @@ struct XQueryPick {
 struct XQueryPicks {
   // Set beforehand: of the sure ones the first is enough.
   bool wantsFirst = false;
+  // Set beforehand: where all that are chosen are sure, their number is enough. Of nodes that is
+  // the number of different ones.
+  enum class Number : uint8_t { Unwanted, OfItems, OfNodes } wantedNumber = Number::Unwanted;
   std::shared_ptr<const std::vector<Value>> items;  // all of them
   std::vector<XQueryPick> chosen;                   // in the order of the items, each once
+  std::optional<uint64_t> number;                   // in place of the list of those, if wanted
 };
 
 class XQueryPicker {

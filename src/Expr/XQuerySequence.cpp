@@ -97,6 +97,18 @@ Value XQueryGatherer::value() {
   return NSNull::null();
 }
 
+void XQueryItemTally::add(const Value& value) {
+  if (!value || isNull(value)) return;
+  if (++_values == 1) _alone = XQueryItemList(normalised(value).get()).count();
+  _flat += XQueryItemList(flattened(value).get()).count();
+}
+
+void XQueryItemTally::addItems(uint64_t number) {
+  if (_values == 0 && number > 0) _alone = 1;
+  _values += number;
+  _flat += number;
+}
+
 XQueryItemList::XQueryItemList(const NSObject* value) {
   if (!value || value->kind() == Kind::Null) return;
   if (const auto* array = dyn_cast<NSArray>(value)) {

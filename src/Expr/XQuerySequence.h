@@ -4,6 +4,7 @@
 #include "xquery/Collection.h"
 #include "xquery/Object.h"
 
+#include <cstdint>
 #include <vector>
 
 namespace xquery {
@@ -52,6 +53,24 @@ class XQueryGatherer {
  private:
   Value _first;
   Ref<XQuerySequence> _sequence;
+};
+
+// How many items the value of a gatherer would have, to which the same is added.
+class XQueryItemTally {
+ public:
+  // `most`: beyond it nobody asks.
+  explicit XQueryItemTally(uint64_t most) : _most(most) {}
+  void add(const Value& value);
+  // So many values of one item each.
+  void addItems(uint64_t number);
+  bool isComplete() const { return _flat >= _most && (_values > 1 || _alone >= _most); }
+  uint64_t count() const { return _values == 1 ? _alone : _flat; }
+
+ private:
+  uint64_t _most;
+  uint64_t _values = 0;
+  uint64_t _alone = 0;  // items of the first value, as it is without a second
+  uint64_t _flat = 0;   // items of all of them
 };
 
 // The item-list rule: null, NSNull and an empty array are no items, an array its elements, anything

@@ -34,6 +34,7 @@ void XQueryCompareWithSets(XQueryPlanning& planning);
 void XQueryJoinForClauses(XQueryPlanning& planning);
 void XQueryJoinQuantifiers(XQueryPlanning& planning);
 void XQueryJoinSteps(XQueryPlanning& planning);
+void XQueryCountLists(XQueryPlanning& planning);
 void XQueryCountPaths(XQueryPlanning& planning);
 void XQueryTakeFirst(XQueryPlanning& planning);
 void XQueryAskMembers(XQueryPlanning& planning);

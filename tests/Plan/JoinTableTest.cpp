@@ -42,7 +42,8 @@ bool select(XQueryJoinTable& table, const Value& probe, XQueryJoinTable::Selecti
 }
 
 // The positions that a table of the keys selects, those that have to be asked with a "?"; "plain"
-// for the plain way. Each item, asked for by itself, has to answer the same.
+// for the plain way. Each item, asked for by itself, has to answer the same, and their number, if
+// it is told, has to be theirs.
 std::string selected(const XQueryJoinRelation& by, const std::vector<Value>& keys,
                      const Value& probe) {
   XQueryJoinTable table = tableOf(by, keys);
@@ -56,6 +57,9 @@ std::string selected(const XQueryJoinRelation& by, const std::vector<Value>& key
     text += (text.empty() ? "" : " ") + std::to_string(match.position) + (match.isSure ? "" : "?");
     answers[match.position] = match.isSure ? std::optional(true) : std::nullopt;
   }
+  const auto number = table.numberFor(*question);
+  EXPECT_EQ(number.value_or(selection.size()), selection.size()) << text;
+  EXPECT_FALSE(number && text.find('?') != std::string::npos) << text;
   for (uint32_t position = 0; position < keys.size(); ++position) {
     EXPECT_EQ(table.isMetBy(*question, position), answers[position]) << position << " of " << text;
   }
@@ -97,11 +101,32 @@ TEST(JoinTable, ManyProbesFindTheSameByTheOrderOfTheKeys) {
           ASSERT_TRUE(select(table, number(probe), selection));
           ASSERT_TRUE(select(other, number(probe), fresh));
           EXPECT_EQ(selection, fresh) << test << negated << probe;
+          EXPECT_EQ(table.numberFor(*table.questionOf(number(probe))), fresh.size());
           EXPECT_EQ(table.meets(number(probe)), !fresh.empty());
         }
       }
     }
   }
+}
+
+TEST(JoinTable, CountsItemsThatNeedNotBeAsked) {
+  const auto numberOf = [](const XQueryJoinRelation& by, const std::vector<Value>& keys,
+                           const Value& probe) {
+    XQueryJoinTable table = tableOf(by, keys);
+    return table.numberFor(*table.questionOf(probe));
+  };
+  const std::vector<Value> texts = {untyped("a"), string("b"), untyped("b"), empty()};
+  EXPECT_EQ(numberOf(condition(equal), texts, string("b")), 2U);
+  EXPECT_EQ(numberOf(condition(equal), texts, sequence({string("a"), string("b")})), 3U);
+  EXPECT_EQ(numberOf(condition(less), texts, string("b")), 1U);
+  EXPECT_EQ(numberOf(condition(less), texts, empty()), 0U);
+  // Two keys of one item may both be met.
+  const std::vector<Value> two = {sequence({untyped("a"), untyped("b")}), untyped("b")};
+  EXPECT_EQ(numberOf(condition(equal), two, string("b")), std::nullopt);
+  EXPECT_EQ(numberOf(condition(equal), {untyped("1"), untyped("x")}, number(1)), std::nullopt);
+  EXPECT_EQ(numberOf(condition(equal), {number(1), boolean(true)}, number(1)), std::nullopt);
+  EXPECT_EQ(numberOf(condition(less), {integer(9007199254740993)}, integer(9007199254740992)),
+            std::nullopt);
 }
 
 // As pairs they would fill gigabytes.

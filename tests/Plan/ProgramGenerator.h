@@ -423,6 +423,7 @@ class ProgramGenerator {
                     }) +
              ")" + (_random.below(4) ? "" : ", " + std::string("$u"));
     }
+    if (_random.below(4) == 0) return counted(depth);
     if (_random.below(5) == 0) return conditional(depth);
     if (_random.below(5) == 0) return chain();
     if (_random.below(6) == 0) return earlier();
@@ -451,6 +452,44 @@ class ProgramGenerator {
       return isSum ? "(sum(" + clause + condition + value + " else 0))"
                    : "(" + clause + condition + expr(depth - 1) + " else ())";
     });
+  }
+
+  // Of which only the number is asked for, mostly.
+  std::string counted(int depth) {
+    const std::string clause = "for $u in " + many() + " ";
+    const auto item = [&] {
+      return _random.oneOf({"$u", "$u", "1", "3", "$u/@x", "(1, $u)", "string($u)", variable()});
+    };
+    const std::string list = within("$u", [&] {
+      switch (_random.below(4)) {
+        case 0:
+          return clause + "return if (" + matches("$u") + ") then " + item() + " else ()";
+        case 1:
+          return many() + "[" + matches(".") + "]" + _random.oneOf({"", "", "/*"});
+        case 2:
+          return clause + "where " + matches("$u") + " return " + expr(depth - 1);
+        default:
+          return clause + "where " + matches("$u") + " return " + item();
+      }
+    });
+    switch (_random.below(4)) {
+      case 0:
+        return "(let $l := " + list + " return " +
+               _random.oneOf({"count($l)", "(count($l), exists($l))", "count(($l)) + 1",
+                              "(count($l), $l)", "(if ($l) then 1 else 2)", "not($l)",
+                              "(for $n in 1 to 2 where empty($l) return $n)",
+                              "(if (empty($l)) then 'u' else boolean($l))"}) +
+               ")";
+      case 1:
+        return "sum(" + clause + "where " + within("$u", [&] { return matches("$u"); }) +
+               " return " + _random.oneOf({"1", "2", "-1", "0.5"}) +
+               _random.oneOf({")", ", 0)", ", ())"});
+      default:
+        return "(" +
+               _random.oneOf(
+                   {"count(", "count(", "exists(", "empty(", "1 < count(", "boolean(", "not("}) +
+               list + "))";
+    }
   }
 
   // Clauses that are joined through another one.

@@ -10,6 +10,7 @@
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryErrors.h"
+#include "Types/XQueryNumber.h"
 #include "xquery/Collection.h"
 #include "xquery/Number.h"
 
@@ -17,10 +18,14 @@
 
 namespace xquery {
 
-// What the tuples have yielded: values, or items with their keys when there are order specs.
+// What the tuples have yielded: values, or their number where that is all that is asked for, or
+// items with their keys when there are order specs.
 struct XQueryFLWORResults {
   XQueryGatherer values;
+  std::optional<XQueryItemTally> tally;
   XQuerySortList sortList;
+
+  bool areComplete() const { return tally && tally->isComplete(); }
 };
 
 // --- clauses -------------------------------------------------------------------------------------
@@ -148,6 +153,7 @@ bool XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
   XQueryClauseItems items(clause.expr(), withContext);
   if (items.haveFailed()) return false;
   XQueryPicks picks;
+  if (isLast && wantsNumberOfPicks(toResults)) picks.wantedNumber = XQueryPicks::Number::OfItems;
   if (items.pick(clause.picker(), withContext, picks)) {
     return evaluatePicks(clause, index, picks, toResults, withContext);
   }
@@ -180,6 +186,8 @@ bool XQueryFLWORExpr::evaluatePicks(const XQueryForExpr& clause, size_t index,
   const bool isLast = index + 1 == _forLet.size();
   const auto& items = *picks.items;
   const XQueryExpr* sureReturn = _sureReturn ? _sureReturn.get() : _returnExpr.get();
+  const uint64_t number = picks.number.value_or(picks.chosen.size());
+  if (picks.number && !addPicks(number, toResults, withContext)) return false;
   for (const XQueryPick& pick : picks.chosen) {
     checkWork();
     setTuple(clause, items[pick.position], pick.position, withContext);
@@ -189,12 +197,34 @@ bool XQueryFLWORExpr::evaluatePicks(const XQueryForExpr& clause, size_t index,
     if (!goesOn) return false;
   }
   constexpr size_t two = 2;
-  const size_t others = _otherReturn ? std::min(two, items.size() - picks.chosen.size()) : 0;
+  const size_t others = _otherReturn ? std::min(two, items.size() - number) : 0;
   for (size_t k = 0; k < others; ++k) {
     if (!addTuple(_otherReturn.get(), toResults, withContext)) return false;
   }
   // Where the ID is used again by a variable that is never set, the last item can be read.
   setTuple(clause, items.back(), items.size() - 1, withContext);
+  return true;
+}
+
+bool XQueryFLWORExpr::wantsNumberOfPicks(const XQueryFLWORResults& results) const {
+  return results.tally ? _yield.isOneItem : _yield.summand.has_value();
+}
+
+// Adds what so many items yield of which each is picked for certain.
+bool XQueryFLWORExpr::addPicks(uint64_t number, XQueryFLWORResults& toResults,
+                               XQueryContext& withContext) const {
+  if (toResults.tally) {
+    toResults.tally->addItems(number);
+    return !toResults.areComplete();
+  }
+  if (number == 0) return true;
+  // The sum of one item is that item itself.
+  if (number == 1) {
+    return addTuple(_sureReturn ? _sureReturn.get() : _returnExpr.get(), toResults, withContext);
+  }
+  const auto sum = static_cast<int64_t>(number) * *_yield.summand;
+  toResults.values.add(XQueryNumber::integerWithInt64(sum));
+  toResults.values.add(XQueryNumber::integerWithInt64(0));
   return true;
 }
 
@@ -214,6 +244,10 @@ bool XQueryFLWORExpr::addTuple(const XQueryExpr* returned, XQueryFLWORResults& t
   if (XQueryHasFailed(value, withContext)) return false;
   if (!_orderSpecs.empty()) {
     return addSortItems(std::move(value), toResults.sortList, withContext);
+  }
+  if (toResults.tally) {
+    toResults.tally->add(value);
+    return !toResults.areComplete();
   }
   toResults.values.add(std::move(value));
   return true;
@@ -241,6 +275,13 @@ bool XQueryFLWORExpr::addSortItems(Value value, XQuerySortList& toList,
     toList.items.push_back({items[i], sortInfo, i});
   }
   return true;
+}
+
+std::optional<uint64_t> XQueryFLWORExpr::countItems(uint64_t most, XQueryContext& context) const {
+  XQueryFLWORResults results;
+  results.tally.emplace(most);
+  if (!evaluateStartingAt(0, results, context) && !results.areComplete()) return std::nullopt;
+  return std::min(results.tally->count(), most);
 }
 
 Value XQueryFLWORExpr::computeValue(XQueryContext& context) const {

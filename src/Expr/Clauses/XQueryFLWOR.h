@@ -5,6 +5,8 @@
 #include "Expr/XQueryExpr.h"
 #include "Expr/XQuerySequence.h"
 
+#include <cstdint>
+#include <optional>
 #include <utility>
 #include <vector>
 
@@ -116,8 +118,18 @@ class XQueryFLWORExpr : public XQueryExpr {
     _sureReturn = std::move(ofSure);
     _otherReturn = std::move(ofOthers);
   }
+  // What is known of each item that is picked for certain: that it yields one item, or the same
+  // summand, and nobody can tell whether that is evaluated.
+  struct Yield {
+    bool isOneItem = false;
+    std::optional<int64_t> summand;  // where the value is summed, and nothing else
+  };
+  void setYieldOfPicks(Yield yield) { _yield = yield; }
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
+  // How many items the value has, or `most` where there are more, having looked no further than
+  // that takes. None after an error. For one without order specs.
+  std::optional<uint64_t> countItems(uint64_t most, XQueryContext& context) const;
   void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:
@@ -127,7 +139,7 @@ class XQueryFLWORExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  // These answer false when an error has come up.
+  // These answer false when an error has come up, or nothing more is wanted.
   bool evaluateStartingAt(size_t clause, XQueryFLWORResults& toResults,
                           XQueryContext& withContext) const;
   bool evaluateFor(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
@@ -141,6 +153,8 @@ class XQueryFLWORExpr : public XQueryExpr {
 
   bool evaluatePicks(const XQueryForExpr& clause, size_t index, const XQueryPicks& picks,
                      XQueryFLWORResults& toResults, XQueryContext& withContext) const;
+  bool wantsNumberOfPicks(const XQueryFLWORResults& results) const;
+  bool addPicks(uint64_t number, XQueryFLWORResults& toResults, XQueryContext& withContext) const;
   static void setTuple(const XQueryForExpr& clause, Value item, size_t position,
                        XQueryContext& context);
 
@@ -150,6 +164,7 @@ class XQueryFLWORExpr : public XQueryExpr {
   Ref<XQueryExpr> _returnExpr;
   Ref<XQueryExpr> _sureReturn;
   Ref<XQueryExpr> _otherReturn;
+  Yield _yield;
 };
 
 // "ordered {...}" and "unordered {...}": the ordering mode for the extent of the operand.

@@ -38,6 +38,8 @@ class XQueryPathResults {
   // Whether further nodes make no difference.
   bool isComplete() const { return _count >= _most; }
   uint64_t count() const { return _count; }
+  // So many nodes more, none of them among those that were added, where they are only counted.
+  void addNumber(uint64_t number) { _count += number; }
   void setIsReversed(bool isReversed) { _isReversed = isReversed; }
   bool isReversed() const { return _isReversed; }
   // A value shape. Nodes are sorted when `ordered`, into reverse document order after a reverse

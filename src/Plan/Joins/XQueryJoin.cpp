@@ -7,6 +7,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "xquery/Number.h"
+#include "xquery/XMLNode.h"
 
 #include <algorithm>
 #include <utility>
@@ -70,10 +71,28 @@ class XQueryJoin::Tables final : public XQueryKeptValue {
     return true;
   }
 
+  // Whether no node comes up twice, which their order proves.
+  bool holdsEachNodeOnce() {
+    if (!_isAscending) {
+      WorkPacer pacer;
+      const auto breaksOrder = [&pacer](const Value& one, const Value& next) {
+        pacer.turn();
+        const auto* a = cast<NSXMLNode>(one.get());
+        const auto* b = cast<NSXMLNode>(next.get());
+        return !NSXMLNode::haveComparableOrder(a, b) || a->orderNumber() >= b->orderNumber();
+      };
+      _isAscending = std::adjacent_find(items->begin(), items->end(), breaksOrder) == items->end();
+    }
+    return *_isAscending;
+  }
+
   const XQueryJoinTable::Items items;
   std::vector<std::unique_ptr<XQueryJoinTable>> byTerm;  // null for one that is not there
   size_t next = 0;                                       // the one that is made next
   size_t picked = 0;                                     // items, since the last one was made
+
+ private:
+  std::optional<bool> _isAscending;  // none before it is asked
 };
 
 // What a table is asked in this round.
@@ -113,9 +132,11 @@ bool XQueryJoin::pick(const Value& source, const Lister& listItems, XQueryContex
   std::vector<Asked> asked;
   if (!askEach(*found, guards == Truth::Yes, context, asked)) return false;
   const bool areAll = asked.size() == _condition.terms.size();
-  select(asked, areAll && _condition.isWhole, picks);
+  const bool areSure = areAll && _condition.isWhole;
   picks.items = found->items;
-  found->picked += picks.chosen.size();
+  if (areSure) picks.number = numberOf(*found, asked, picks.wantedNumber);
+  if (!picks.number) select(asked, areSure, picks);
+  found->picked += picks.number.value_or(picks.chosen.size());
   if (!areAll && !found->areAllTried() && found->picked >= found->items->size()) {
     addTable(*found, context);
   }
@@ -235,6 +256,15 @@ bool XQueryJoin::askEach(const Tables& tables, bool withProbes, XQueryContext& c
     if (term.mustAnswer && !answers) break;
   }
   return !asked.empty();
+}
+
+// How many items a single table picks, if that can be told without a list of them.
+std::optional<uint64_t> XQueryJoin::numberOf(Tables& tables, const std::vector<Asked>& asked,
+                                             XQueryPicks::Number wanted) {
+  using Number = XQueryPicks::Number;
+  if (wanted == Number::Unwanted || asked.size() != 1) return std::nullopt;
+  if (wanted == Number::OfNodes && !tables.holdsEachNodeOnce()) return std::nullopt;
+  return asked.front().table->numberFor(asked.front().question);
 }
 
 // The table that the fewest items meet picks, and the others are asked of these.

@@ -18,6 +18,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <utility>
 #include <vector>
 
@@ -54,6 +55,8 @@ class XQueryJoin final : public XQueryPicker {
   Value keyOf(const Value& item, size_t position, size_t term, XQueryContext& context) const;
   bool askEach(const Tables& tables, bool withProbes, XQueryContext& context,
                std::vector<Asked>& asked) const;
+  static std::optional<uint64_t> numberOf(Tables& tables, const std::vector<Asked>& asked,
+                                          XQueryPicks::Number wanted);
   static void select(std::vector<Asked>& asked, bool areSure, XQueryPicks& picks);
 
   const XQueryExpr& _owner;

@@ -183,6 +183,7 @@ void XQueryJoinTable::read(uint32_t position, const Value& value) {
   Operands keys;
   for (size_t i = 0; i < list.count(); ++i) keys.emplace_back(list[i]);
   if (!takes(keys)) return _irregular.push_back(position);
+  _hasSeveralKeys = _hasSeveralKeys || keys.size() > 1;
   for (size_t i = 0; i < keys.size(); ++i) {
     if (_keys.size() == mostItems) throw std::bad_alloc();
     if (!list[i]->isNode()) _keptKeys.emplace_back(list[i]);
@@ -384,6 +385,33 @@ size_t XQueryJoinTable::estimate(const std::vector<Key>& keys, const std::vector
   return count;
 }
 
+std::optional<uint64_t> XQueryJoinTable::numberFor(const Question& question) {
+  const bool isOpen = question.way == Way::NumbersButTies || !isRegularFor(question);
+  if (isOpen || _isComplement || _hasSeveralKeys || !_irregular.empty()) return std::nullopt;
+  auto number = question.way == Way::Texts
+                    ? numberInOrder(_texts, question.texts, _textOrder)
+                    : numberInOrder(_numbers, question.numbers, _numberOrder);
+  if (!number) {
+    number = 0;
+    forEachMet(question, false, [&number](size_t, bool) {
+      ++*number;
+      return true;
+    });
+  }
+  countMemory();
+  return number;
+}
+
+// Of keys that are sorted; nothing where they are not, or not asked in their order.
+template <class Key>
+std::optional<uint64_t> XQueryJoinTable::numberInOrder(const std::vector<Key>& keys,
+                                                       const std::vector<Key>& probes,
+                                                       Order& order) const {
+  const bool isAsked = _relation.test != XQueryRelation::Equal && !probes.empty();
+  if (!isAsked || order.asked < askedToSort) return std::nullopt;
+  return metInOrder(_relation, keys, probes.front(), order).size();
+}
+
 std::optional<bool> XQueryJoinTable::isMetBy(const Question& question, uint32_t position) {
   if (isIrregular(position)) return std::nullopt;
   if (_firstKeys.empty()) findKeysOfItems();
@@ -483,7 +511,6 @@ void XQueryJoinTable::forEachOrdered(const std::vector<Key>& keys, const std::ve
                                      Order& order, Asked asked, Visit visit) {
   if (probes.empty()) return;
   const Key& probe = probes.front();
-  constexpr uint32_t few = 16;
   // So many are found in the order of the items as quickly as put into it.
   constexpr size_t part = 16;
   const XQueryRelation relation = asked.areTiesOpen ? withTies(_relation) : _relation;
@@ -491,7 +518,7 @@ void XQueryJoinTable::forEachOrdered(const std::vector<Key>& keys, const std::ve
     return asked.areTiesOpen && orderOf(keys[key], probe) == 0;
   };
   WorkPacer pacer;
-  if (order.asked < few) {
+  if (order.asked < askedToSort) {
     ++order.asked;
   } else {
     const auto met = metInOrder(relation, keys, probe, order);

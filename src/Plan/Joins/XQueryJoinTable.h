@@ -84,6 +84,9 @@ class XQueryJoinTable final : public XQueryKeptValue {
   // the list, in the order of the items, each once. With `wantsFirst`, sure items behind the first
   // one may be left out.
   void select(const Question& question, Selection& selection, bool wantsFirst = false);
+  // How many items `select` puts into the list; nothing where some have to be asked, and where
+  // counting takes the list.
+  std::optional<uint64_t> numberFor(const Question& question);
   // Whether one item does; nothing where it has to be asked.
   std::optional<bool> isMetBy(const Question& question, uint32_t position);
   // Whether the item has always to be asked.
@@ -118,7 +121,9 @@ class XQueryJoinTable final : public XQueryKeptValue {
     std::vector<uint32_t> _keys;
   };
 
-  // Keys by their order, least first; without those that meet nothing.
+  // Keys by their order, least first; without those that meet nothing. So many probes are compared
+  // with every key, before they are sorted.
+  static constexpr uint32_t askedToSort = 16;
   struct Order {
     std::vector<uint32_t> keys;
     uint32_t asked = 0;
@@ -145,6 +150,9 @@ class XQueryJoinTable final : public XQueryKeptValue {
   template <class Key>
   size_t estimate(const std::vector<Key>& keys, const std::vector<Key>& probes, Buckets& buckets,
                   Order& order);
+  template <class Key>
+  std::optional<uint64_t> numberInOrder(const std::vector<Key>& keys,
+                                        const std::vector<Key>& probes, Order& order) const;
   template <class Key>
   std::optional<bool> isMet(const std::vector<Key>& keys, const std::vector<Key>& probes,
                             bool areTiesOpen, uint32_t position) const;
@@ -178,6 +186,7 @@ class XQueryJoinTable final : public XQueryKeptValue {
   bool _hasDecimals = false;
   bool _hasInexactDecimals = false;
   bool _isScanned = false;
+  bool _hasSeveralKeys = false;  // of one item
   int64_t _countedBytes = 0;
   const Items _items;
   std::vector<Value> _keptKeys;  // the atomic keys, to which the texts refer

@@ -83,6 +83,26 @@ std::optional<uint64_t> XQueryWalkedPath::countNodes(uint64_t most, XQueryContex
   return answer == Answer::Items ? 0 : std::min(results.count(), most);
 }
 
+std::optional<uint64_t> XQueryWalkedPath::countItems(uint64_t most, XQueryContext& context) const {
+  if (_countsNodes) return countNodes(most, context);
+  if (!_steps.empty() || !_picker || showsErrors(context)) {
+    const Value items = evaluateWithContext(context);
+    if (!items) return std::nullopt;
+    return std::min<uint64_t>(XQueryItemList(items.get()).count(), most);
+  }
+  XQueryCheckStack(context);
+  auto& dynamic = context._internal();
+  const int64_t position = dynamic.position();
+  const int64_t last = dynamic.last();
+  Value contextItem = dynamic.contextItem();
+  std::optional<uint64_t> number;
+  const Value items = evaluateStart(context, &number);
+  if (!items) return std::nullopt;
+  dynamic.setContextItem(std::move(contextItem), position);
+  dynamic.setLast(last);
+  return std::min(number.value_or(XQueryItemList(items.get()).count()), most);
+}
+
 Value XQueryWalkedPath::firstItems(uint64_t most, XQueryContext& context) const {
   XQueryCheckStack(context);
   XQueryPathResults results;
@@ -133,23 +153,32 @@ XQueryWalkedPath::Answer XQueryWalkedPath::walk(XQueryContext& context, Value& i
   return walk.hasFailed ? Answer::Failed : Answer::Results;
 }
 
-Value XQueryWalkedPath::evaluateStart(XQueryContext& context) const {
+// With `number`, the number of items that are picked may be put there in place of a list of them.
+Value XQueryWalkedPath::evaluateStart(XQueryContext& context,
+                                      std::optional<uint64_t>* number) const {
   Value items =
       _start->expr() ? _start->expr()->evaluateWithContext(context) : Value(NSNull::null());
   if (XQueryHasFailed(items, context)) return {};
-  if (_picker && _pickedStep == _start && pickItems(items, context)) return items;
+  if (_picker && _pickedStep == _start && pickItems(items, context, number)) return items;
   return _start->handlePreicatesFromIndex(0, std::move(items), context);
 }
 
 // --- picking -------------------------------------------------------------------------------------
 
 // Filters the items of the start, of which only some are asked; false when each has to be.
-bool XQueryWalkedPath::pickItems(Value& items, XQueryContext& context) const {
+bool XQueryWalkedPath::pickItems(Value& items, XQueryContext& context,
+                                 std::optional<uint64_t>* number) const {
   const auto listItems = [&items](std::vector<Value>& listed) {
     return XQueryListItems(XQueryItemList(items.get()), listed);
   };
   XQueryPicks picks;
+  if (number) picks.wantedNumber = XQueryPicks::Number::OfItems;
   if (!_picker->pick(items, listItems, context, picks)) return false;
+  if (picks.number) {
+    *number = picks.number;
+    items = NSNull::null();
+    return true;
+  }
   context._internal().setLast(static_cast<int64_t>(picks.items->size()));
   XQueryGatherer kept;
   for (const XQueryPick& pick : picks.chosen) {
@@ -201,9 +230,15 @@ bool XQueryWalkedPath::pickNodes(const Value& start, XQueryPathWalk& walk) const
     return listNodes(start, *step, walk, listed);
   };
   XQueryPicks picks;
+  const bool isCounted = walk.results.countsOnly() && step == &_steps.back();
+  if (isCounted) picks.wantedNumber = XQueryPicks::Number::OfNodes;
   const bool hasPicked = _picker->pick(start, list, walk.context, picks);
   if (walk.hasFailed) return true;
   if (!hasPicked) return false;
+  if (picks.number) {
+    walk.results.addNumber(*picks.number);
+    return true;
+  }
   std::vector<NSXMLNode*>& nodes = walk.openNodeList();
   for (const XQueryPick& pick : picks.chosen) {
     auto* node = cast<NSXMLNode>((*picks.items)[pick.position]);

@@ -45,6 +45,9 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   // How many nodes the path finds, or `most` where there are more, having looked no further than
   // that takes. None after an error. For a path that countsNodes.
   std::optional<uint64_t> countNodes(uint64_t most, XQueryContext& context) const;
+  // The same for any path, whose items may be no nodes: it is evaluated as a whole, unless it
+  // countsNodes, or is a filter whose items are picked. None as well where it has no value.
+  std::optional<uint64_t> countItems(uint64_t most, XQueryContext& context) const;
   // Its value, of which only the first so many items are wanted: there may be more of them. Null
   // after an error. For a path that findsInOrder.
   Value firstItems(uint64_t most, XQueryContext& context) const;
@@ -84,11 +87,11 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   enum class Answer : uint8_t { Failed, Items, Results };
   Answer evaluate(XQueryContext& context, Value& items, XQueryPathResults& results) const;
   Answer walk(XQueryContext& context, Value& items, XQueryPathResults& results) const;
-  Value evaluateStart(XQueryContext& context) const;
+  Value evaluateStart(XQueryContext& context, std::optional<uint64_t>* number = nullptr) const;
   bool mayEndEarly(const Value& items, const XQueryPathWalk& walk) const;
   bool listNodes(const Value& start, const XQueryWalkedStep& step, XQueryPathWalk& walk,
                  std::vector<Value>& listed) const;
-  bool pickItems(Value& items, XQueryContext& context) const;
+  bool pickItems(Value& items, XQueryContext& context, std::optional<uint64_t>* number) const;
   bool pickNodes(const Value& start, XQueryPathWalk& walk) const;
   bool showsErrors(const XQueryContext& context) const;
 

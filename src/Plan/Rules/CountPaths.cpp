@@ -1,26 +1,30 @@
-// How many nodes there are, and whether there are any.
+// How many items there are, and whether there are any.
 //
-// Pattern     count(P), exists(P), empty(P), not(P), boolean(P); count(P) compared with an integer;
-//             P where its truth is asked for: as a predicate, a condition, an operand of "and" and
+// Pattern     count(E), exists(E), empty(E), not(E), boolean(E); count(E) compared with an integer;
+//             E where its truth is asked for: as a predicate, a condition, an operand of "and" and
 //             "or"
-// Facts       P is a path whose last step is an axis step, all of whose tests and predicates can be
+// Facts       E is a path whose last step is an axis step, all of whose tests and predicates can be
 //             repeated and cannot fail once the first step is evaluated
-//             (XQueryWalkedPath::countsNodes)
-// Operator    XQueryPathCount: no list is made, and the walk ends as soon as the answer is certain
-// Why         what is not walked could only have found more nodes; the truth of nodes is that there
+//             (XQueryWalkedPath::countsNodes); or it is a FLWOR without order specs, or a filter.
+//             Of these only nodes are asked for their truth. They are evaluated to the end unless
+//             they can be repeated, cannot fail but in what the first clause walks, and leave
+//             nothing in variables that can be told
+// Operator    XQueryPathCount, XQueryItemCount: no list is made, and a walk ends as soon as the
+//             answer is certain. What a join picks for certain is not even listed where it is one
+//             item each (XQueryFLWORExpr::Yield)
+// Why         what is not walked could only have found more items; the truth of nodes is that there
 //             are any
+#include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
-#include "Expr/XQueryLists.h"
-#include "Functions/Boolean.h"
-#include "Functions/Sequence.h"
-#include "Functions/XQueryFunctionCall.h"
+#include "Plan/Operators/XQueryItemCount.h"
 #include "Plan/Operators/XQueryPathCount.h"
 #include "Plan/Paths/XQueryWalkedPath.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/NumberQuestions.h"
+#include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/PositionConditions.h"
 
-#include <array>
 #include <optional>
 
 namespace xquery {
@@ -28,19 +32,20 @@ namespace {
 
 using Question = XQueryPathCount::Question;
 
-// The path that counts its nodes, in parentheses or not; null for anything else.
-XQueryWalkedPath* pathIn(const XQueryExpr* expr) {
-  const auto* planned = dyn_cast<XQueryPlannedExpr>(XQueryWithoutParentheses(expr));
+// The path that counts its nodes; null for anything else.
+XQueryWalkedPath* countingPathIn(const XQueryExpr& expr) {
+  const auto* planned = dyn_cast<XQueryPlannedExpr>(&expr);
   const XQueryWalkedPath* path = planned ? planned->walkedPath() : nullptr;
   return path && path->countsNodes() ? const_cast<XQueryWalkedPath*>(path) : nullptr;
 }
 
-// Of a call with one argument.
-const XQueryExpr* onlyArgument(const XQueryExpr* expr, XQueryProcedure function) {
-  const auto* call = dyn_cast<XQueryFunctionCall>(XQueryWithoutParentheses(expr));
-  const bool fits = call && call->builtIn() && call->function() == function && call->args() &&
-                    call->args()->count() == 1;
-  return fits ? call->args()->objectAtIndex(0) : nullptr;
+// Of a call of count(), in parentheses or not.
+XQueryPlaceID countedIn(const XQueryPlanning& planning, XQueryPlaceID place) {
+  const XQueryProgram& program = planning.program;
+  place = XQueryPlaceInside(program, place);
+  const auto asks = XQueryNumberQuestionOf(*program[place].expr);
+  const bool isCount = asks && asks->question.least == 0 && planning.isOpen(place);
+  return isCount ? program.firstPart(program.firstPart(place)) : XQueryNoPlace;
 }
 
 // "count compared with number" as a question for some number of nodes at least; none for one that
@@ -91,68 +96,70 @@ class Search {
  private:
   const XQueryExpr* at(XQueryPlaceID place) const { return _planning.program[place].expr; }
 
-  bool wrap(XQueryPlaceID place, XQueryWalkedPath* path, Question question) {
-    if (!path) return false;
-    _planning.wrap(place, XQueryPathCount::exprWithPlain(*_planning.program[place].slot,
-                                                         Ref<XQueryWalkedPath>(path), question));
+  // Answers the question about the items of another place there.
+  bool wrap(XQueryPlaceID place, XQueryPlaceID counted, Question question, bool asksForTruth) {
+    if (counted == XQueryNoPlace) return false;
+    counted = XQueryPlaceInside(_planning.program, counted);
+    const Ref<XQueryExpr> items = _planning.exprAt(counted);
+    const Ref<XQueryExpr> plain = _planning.exprAt(place);
+    if (XQueryWalkedPath* path = countingPathIn(*items)) {
+      _planning.wrap(place,
+                     XQueryPathCount::exprWithPlain(plain, Ref<XQueryWalkedPath>(path), question));
+      return true;
+    }
+    const XQueryFacts& facts = _planning.facts[counted];
+    if (!XQueryCountsItems(*items) || (asksForTruth && !facts.are(XQueryItems::Node))) return false;
+    _planning.wrap(place,
+                   XQueryItemCount::exprWithPlain(plain, items, question, mayEndEarly(counted)));
     return true;
   }
 
+  // Whether what is behind the answer does nothing and cannot fail. What the first clause of a
+  // FLWOR walks is always evaluated, once.
+  bool mayEndEarly(XQueryPlaceID place) const {
+    using namespace XQueryDeeds;
+    const XQueryFacts& facts = _planning.facts[place];
+    if (!facts.isRepeatable() || facts.does(LoadsDocuments)) return false;
+    if (_planning.showsLeftovers(facts.assigns, place)) return false;
+    if (!facts.does(MayFail)) return true;
+    if (at(place)->kind() != Kind::FLWORExpr) return false;
+    const XQueryPlaceID first = _planning.program.firstPart(place);
+    const auto* clause = dyn_cast<XQueryForExpr>(at(first));
+    if (!clause || clause->type()) return false;
+    XQueryPlaceID part = first;
+    do part = _planning.program.nextPart(part);
+    while (part != XQueryNoPlace && !_planning.facts[part].does(MayFail));
+    return part == XQueryNoPlace;
+  }
+
   bool lookAtCall(XQueryPlaceID place) {
-    struct Row {
-      XQueryProcedure function;
-      Question question;
-    };
-    static constexpr std::array<Row, 5> rows = {{
-        {fn_count, {0, false}},
-        {fn_exists, {1, false}},
-        {fn_boolean, {1, false}},
-        {fn_empty, {1, true}},
-        {fn_not, {1, true}},
-    }};
-    if (!isa<XQueryFunctionCall>(at(place))) return false;
-    for (const Row& row : rows) {
-      const XQueryExpr* argument = onlyArgument(at(place), row.function);
-      if (argument) return wrap(place, pathIn(argument), row.question);
-    }
-    return false;
+    const auto asks = XQueryNumberQuestionOf(*at(place));
+    if (!asks) return false;
+    const XQueryPlaceID argument = _planning.program.firstPart(_planning.program.firstPart(place));
+    return wrap(place, argument, asks->question, asks->isOfTruth);
   }
 
   bool lookAtComparison(XQueryPlaceID place) {
     const auto* comparison = dyn_cast<XQueryOperatorExpr>(at(place));
-    if (!comparison) return false;
+    const XQueryPlaceID left = comparison ? _planning.program.firstPart(place) : XQueryNoPlace;
+    const XQueryPlaceID right =
+        left == XQueryNoPlace ? XQueryNoPlace : _planning.program.nextPart(left);
+    if (right == XQueryNoPlace) return false;
     int type = comparison->operatorType();
-    const XQueryExpr* counted = onlyArgument(comparison->left(), fn_count);
+    XQueryPlaceID counted = countedIn(_planning, left);
     auto number = XQuerySmallIntegerIn(comparison->right());
-    if (!counted) {
-      counted = onlyArgument(comparison->right(), fn_count);
+    if (counted == XQueryNoPlace) {
+      counted = countedIn(_planning, right);
       number = XQuerySmallIntegerIn(comparison->left());
       type = XQueryMirroredComparison(type);
     }
-    if (!counted || !number) return false;
+    if (counted == XQueryNoPlace || !number) return false;
     const auto question = questionOf(type, *number);
-    return question && wrap(place, pathIn(counted), *question);
+    return question && wrap(place, counted, *question, false);
   }
 
   void lookAtTruth(XQueryPlaceID place) {
-    if (isAskedForTruth(place)) wrap(place, pathIn(_planning.exprAt(place).get()), {1, false});
-  }
-
-  bool isAskedForTruth(XQueryPlaceID place) const {
-    switch (_planning.program[place].role) {
-      case XQueryRole::Test:
-      case XQueryRole::Where:
-      case XQueryRole::Satisfies:
-      case XQueryRole::Predicate:
-        return true;
-      case XQueryRole::Operand:
-      case XQueryRole::LaterOperand: {
-        const auto* whole = dyn_cast<XQueryOperatorExpr>(at(_planning.program[place].parent));
-        return whole && XQueryOperatorExpr::operatorClassification(whole->operatorType()) == 1;
-      }
-      default:
-        return false;
-    }
+    if (XQueryIsAskedForTruth(_planning.program, place)) wrap(place, place, {1, false}, true);
   }
 
   XQueryPlanning& _planning;

@@ -18,7 +18,7 @@
 //             what would have been evaluated for it has no effect, and fails neither. Of the zeros
 //             of a sum two are left, since the sum of one item is that item itself
 #include "Expr/Clauses/XQueryFLWOR.h"
-#include "Expr/XQueryLists.h"
+#include "Expr/XQueryLeaves.h"
 #include "Functions/Aggregate.h"
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Joins/XQueryClauseJoins.h"
@@ -34,16 +34,41 @@ namespace {
 
 using Picks = XQueryClauseJoins::Picks;
 
-// Whether all that is made of the value is its sum.
-bool isSummed(const XQueryProgram& program, XQueryPlaceID place) {
-  XQueryPlaceID whole = program[place].parent;
-  while (whole != XQueryNoPlace && program[whole].expr->kind() == Kind::ExprList &&
-         cast<XQueryExprList>(program[whole].expr)->count() == 1) {
-    whole = program[whole].parent;
+// Whether all that is made of the value is its sum. What stands for the sum of nothing may be given
+// as a second argument.
+enum class Sum : uint8_t { None, Plain, OrZero };
+Sum sumOf(const XQueryProgram& program, XQueryPlaceID place) {
+  place = XQueryPlaceAround(program, place);
+  const XQueryPlaceID list = program[place].parent;
+  if (list == XQueryNoPlace || program[list].expr->kind() != Kind::Args) return Sum::None;
+  const auto* call = dyn_cast<XQueryFunctionCall>(program[program[list].parent].expr);
+  const bool isSum = call && call->builtIn() && call->function() == fn_sum;
+  if (!isSum || program.firstPart(list) != place) return Sum::None;
+  return call->args()->count() == 1 ? Sum::Plain : Sum::OrZero;
+}
+
+// Whether the expression answers one item, and nobody can tell whether it is evaluated.
+bool isOneItem(const XQueryPlanning& planning, XQueryPlaceID place) {
+  const XQueryFacts& facts = planning.facts[place];
+  const auto* variable = dyn_cast<XQueryVariable>(planning.program[place].expr);
+  const XQueryPlaceID binder = planning.program[place].binder;
+  const bool isItem =
+      variable && binder != XQueryNoPlace && planning.program[binder].expr->kind() == Kind::ForExpr;
+  using namespace XQueryDeeds;
+  return facts.least == 1 && facts.most == 1 && (isItem || !facts.mayBe(XQueryItems::Other)) &&
+         facts.isRepeatable() && !facts.does(MayFail | LoadsDocuments) && facts.assigns.isEmpty();
+}
+
+// What is known of the items that are picked, of which each yields what is written there.
+void describeYield(const XQueryPlanning& planning, XQueryPlaceID place, XQueryPlaceID answer,
+                   XQueryFLWORExpr& expr) {
+  if (!expr.orderSpecs().empty()) return;
+  XQueryFLWORExpr::Yield yield;
+  yield.isOneItem = isOneItem(planning, answer);
+  if (sumOf(planning.program, place) != Sum::None) {
+    yield.summand = XQuerySmallIntegerIn(planning.program[answer].expr);
   }
-  if (whole == XQueryNoPlace || program[whole].expr->kind() != Kind::Args) return false;
-  const auto* call = dyn_cast<XQueryFunctionCall>(program[program[whole].parent].expr);
-  return call && call->builtIn() && call->function() == fn_sum && call->args()->count() == 1;
+  expr.setYieldOfPicks(yield);
 }
 
 // "return if (C) then T else ()", and "else 0" in a sum.
@@ -62,12 +87,13 @@ void joinConditional(XQueryPlanning& planning, XQueryPlaceID place, XQueryFLWORE
   const bool isNothing = ofOther.most == 0 && ofOther.deeds == 0 && ofOther.assigns.isEmpty();
   const auto isFor = [](const auto& clause) { return clause->kind() == Kind::ForExpr; };
   const bool isZero =
-      XQuerySmallIntegerIn(program[other].expr) == 0 && isSummed(program, place) &&
+      XQuerySmallIntegerIn(program[other].expr) == 0 && sumOf(program, place) == Sum::Plain &&
       planning.facts[then].are(XQueryItems::Numeric | XQueryItems::Untyped | XQueryItems::Node) &&
       std::count_if(expr.forLet().begin(), expr.forLet().end(), isFor) == 1;
   if (!isNothing && !isZero) return;
   if (!XQueryClauseJoins(planning, place, part, test, Picks::WhereItHolds).join()) return;
   expr.setReturnOfPicks(planning.exprAt(then), isZero ? planning.exprAt(other) : nullptr);
+  describeYield(planning, place, then, expr);
 }
 
 }  // namespace
@@ -79,7 +105,10 @@ void XQueryJoinForClauses(XQueryPlanning& planning) {
     if (!expr) continue;
     const XQueryPlaceID where = program.part(place, XQueryRole::Where);
     if (where != XQueryNoPlace) {
-      XQueryClauseJoins(planning, place, where, where, Picks::WhereItHolds).join();
+      const bool joins =
+          XQueryClauseJoins(planning, place, where, where, Picks::WhereItHolds).join();
+      const XQueryPlaceID answer = program.part(place, XQueryRole::Return);
+      if (joins && answer != XQueryNoPlace) describeYield(planning, place, answer, *expr);
     } else {
       joinConditional(planning, place, *expr);
     }
