@@ -27,7 +27,7 @@ constexpr std::array rules = {
                XQueryCompareWithSets},
     XQueryRule{"counts", "items are counted, or found to be there, without a list of them",
                XQueryCountPaths},
-    XQueryRule{"first", "of a path whose first nodes are asked for, no more is walked",
+    XQueryRule{"first", "no more is walked or sorted than the first items that are asked for",
                XQueryTakeFirst},
     XQueryRule{"members", "whether one node is in a large set is looked up in a table",
                XQueryAskMembers},

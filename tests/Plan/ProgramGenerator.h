@@ -424,6 +424,7 @@ class ProgramGenerator {
              ")" + (_random.below(4) ? "" : ", " + std::string("$u"));
     }
     if (_random.below(4) == 0) return counted(depth);
+    if (_random.below(6) == 0) return first(depth);
     if (_random.below(5) == 0) return conditional(depth);
     if (_random.below(5) == 0) return chain();
     if (_random.below(6) == 0) return earlier();
@@ -489,6 +490,35 @@ class ProgramGenerator {
                _random.oneOf(
                    {"count(", "count(", "exists(", "empty(", "1 < count(", "boolean(", "not("}) +
                list + "))";
+    }
+  }
+
+  // Of which the first items are asked for: of a path, or of what is sorted.
+  std::string first(int depth) {
+    const std::string keys =
+        _random.oneOf({"$u/@x", "string($u)", "name($u)", "number($u/@x)", "count($u/*)",
+                       "$u/@y empty greatest", "xs:integer($u/@x)", "$u/*", "name($u) descending",
+                       "string($u/@x) descending, number($u)", "if ($u/@x) then 1 else 'u'"});
+    const std::string sorted = within("$u", [&] {
+      return "for $u in " + many() + " order by " + keys + " return " +
+             _random.oneOf({"$u", "($u/@x, $u)", "<b>{$u/@x}</b>", "string($u)", expr(depth - 1)});
+    });
+    const std::string list = _random.below(3) ? sorted : path(depth - 1);
+    const std::string part =
+        _random.oneOf({"[1]", "[2]", "[position() <= 3]", "[position() lt 3]", "[last()]"});
+    switch (_random.below(4)) {
+      case 0:
+        return "subsequence((" + list + ")" +
+               _random.oneOf({", 1, 1)", ", 2, 3)", ", 0, 2)", ", 2)"});
+      case 1:
+        return "(let $l := " + list + " return ($l" + part +
+               _random.oneOf({"", ", $l[1]", ", subsequence($l, 1, 4)", ", count($l)"}) + "))";
+      case 2:
+        return "(for $v at $n in (" + list + ") " + _random.oneOf({"", "let $z := $v/* "}) +
+               "where " + _random.oneOf({"$n <= 3", "$n = 2", "3 > $n and $v", "$v and $n lt 2"}) +
+               " return ($n, $v))";
+      default:
+        return "(" + list + ")" + part + _random.oneOf({"", "/@x", "/.."});
     }
   }
 

@@ -309,6 +309,47 @@ TEST(TakeFirst, EndsAtTheLastNodeThatIsAskedFor) {
   EXPECT_GT(stepsOf("subsequence(//a[string(@x)], 2)"), 200);
 }
 
+TEST(TakeFirst, KnowsWhatIsAskedOfAVariableAndByAPosition) {
+  for (const char* text :
+       {"let $l := //a[c] return ($l[1], $l[position() <= 3], subsequence($l, 2, 2))",
+        "let $l := (//a[c]) return ($l)[2]/b", "for $x at $i in //a[c] where $i <= 2 return $x",
+        "for $x at $i in //a[c] let $b := $x/b where 3 > $i and $b return ($b, $i)",
+        "for $x at $i in //a[c], $y in $x/b where ($i eq 2) return $y"}) {
+    EXPECT_EQ(operatorsOf("first", text), 1U) << text;
+    EXPECT_LT(stepsOf(text), 100) << text;
+    resultOf(text, manyNames());
+    resultOf(text, names());
+  }
+  for (const char* text :
+       {"let $l := //a[c] return ($l[1], count($l))", "let $l := //a[c] return $l[last()]",
+        "let $l as item()* := //a[c] return $l[1]", "for $x at $i in //a[c] return ($x, $i)",
+        "for $x at $i in //a[c] where $x/b and $i < 3 return $x",
+        "for $x at $i in //a[c] let $b := $x/b + 1 where $i < 3 return $b",
+        "for $x as element() at $i in //a[c] where $i < 3 return $x",
+        "for $x at $i in //a[c] where $i < 3 or $i > 5 return $x",
+        "(for $x at $i in //a[c] where $i < 3 return $x, some $y in //none satisfies $y, $y)"}) {
+    EXPECT_EQ(operatorsOf("first", text), 0U) << text;
+    resultOf(text, names());
+  }
+}
+
+TEST(TakeFirst, SortsNoMoreThanIsAskedFor) {
+  for (const char* text :
+       {"(for $a in //* order by name($a) descending return $a)[position() <= 4]",
+        "subsequence(for $a in //* order by string($a/@x) return ($a/@x, name($a)), 2, 3)",
+        "let $s := for $a in //* order by count($a/*), name($a) return <n>{$a/@x}</n> return $s[1]",
+        "for $a at $i in (for $a in //* order by $a/@x empty greatest return $a) where $i < 5 "
+        "return $a",
+        "(for $a in //* order by if ($a/@x) then 1 else 'a' return $a)[1]",
+        "(for $a in //* order by xs:date('2004-10-29') return $a)[2]",
+        "(for $a in //* order by xs:integer($a/@x) return $a)[2]",
+        "(for $a in //* order by $a/b return $a)[. = 3]"}) {
+    EXPECT_LE(operatorsOf("first", text), 1U) << text;
+    resultOf(text, manyNames());
+    resultOf(text, names());
+  }
+}
+
 TEST(TakeFirst, LeavesAloneWhatMayComeInAnotherOrder) {
   for (const char* text :
        {"(//a/b)[1]", "(//a/ancestor::*)[1]", "subsequence(//a//b, 1, 1)", "(//b/..)[1]",

@@ -285,13 +285,17 @@ std::optional<uint64_t> XQueryFLWORExpr::countItems(uint64_t most, XQueryContext
 }
 
 Value XQueryFLWORExpr::computeValue(XQueryContext& context) const {
+  return firstItems(UINT64_MAX, context);
+}
+
+Value XQueryFLWORExpr::firstItems(uint64_t most, XQueryContext& context) const {
   XQueryFLWORResults results;
   results.sortList.keyCount = _orderSpecs.size();
   if (!evaluateStartingAt(0, results, context)) return {};
   if (_orderSpecs.empty()) return results.values.value();
 
   const XQueryOrderSpec& first = *_orderSpecs.front();
-  if (!XQueryFLWORSort(results.sortList, first.ascending(), first.emptyLeast())) {
+  if (!XQueryFLWORSortFirst(results.sortList, first.ascending(), first.emptyLeast(), most)) {
     return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
   }
   auto sorted = XQuerySequence::sequence();

@@ -130,6 +130,8 @@ class XQueryFLWORExpr : public XQueryExpr {
   // How many items the value has, or `most` where there are more, having looked no further than
   // that takes. None after an error. For one without order specs.
   std::optional<uint64_t> countItems(uint64_t most, XQueryContext& context) const;
+  // Its value, of which only the first so many items are wanted: others may be left out.
+  Value firstItems(uint64_t most, XQueryContext& context) const;
   void visitParts(XQueryPartVisitor& visitor) override;
 
  protected:

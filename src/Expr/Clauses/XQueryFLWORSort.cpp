@@ -17,7 +17,9 @@
 // Empty keys rank below or above all others of their column, as the empty order says; where that
 // leaves a tie with a key that is not empty, the plain comparison decides. For a descending order
 // the ranks are complemented. So every single comparison has the plain one's answer, and both sorts
-// are the same algorithm.
+// are the same algorithm. Where only the first few items are wanted, and every two keys of a column
+// are known to have an order that does not contradict itself, these are picked without sorting the
+// others.
 #include "Expr/Clauses/XQueryFLWORSort.h"
 
 #include "Expr/Clauses/StableMergeSort.h"
@@ -218,6 +220,9 @@ class Column {
   }
   uint64_t rank(size_t item) const { return _ranks[item]; }
   bool tiesAreEqual() const { return _tiesAreEqual; }
+  // Whether the order is one of all keys. An exact number may be equal to a double to which two
+  // exact numbers are equal that are not equal to each other.
+  bool isTotal() const { return _family != Family::Other && !(_hasDoubles && !_tiesAreEqual); }
 
  private:
   uint64_t rankOf(const NSObject& key, bool emptyLeast) {
@@ -234,11 +239,13 @@ class Column {
     }
     const auto& number = *cast<NSNumber>(&key);
     _tiesAreEqual = _tiesAreEqual && isExactAsDouble(number);
+    _hasDoubles = _hasDoubles || !number.storedDecimal();
     return rankOfNumber(number.doubleValue());
   }
 
   Family _family;
   bool _tiesAreEqual;
+  bool _hasDoubles = false;  // numbers that are not stored as decimals
   uint32_t _prefix = 0;
   std::vector<uint64_t> _ranks;
 };
@@ -267,6 +274,11 @@ class RankedOrder {
     return entries;
   }
 
+  bool isTotal() const {
+    return std::all_of(_columns.begin(), _columns.end(),
+                       [](const auto& each) { return each.isTotal(); });
+  }
+
   bool isBefore(const Entry& a, const Entry& b) {
     return a.rank != b.rank ? a.rank < b.rank : isTiedBefore(a.index, b.index);
   }
@@ -289,12 +301,45 @@ class RankedOrder {
 
 }  // namespace
 
+namespace {
+
+// Leaves the first `most` entries in their order. Of equal ones the earlier is the first.
+void keepFirst(std::vector<Entry>& entries, size_t most, RankedOrder& order) {
+  const auto isBefore = [&order](const Entry& a, const Entry& b) {
+    if (order.isBefore(a, b)) return true;
+    return !order.isBefore(b, a) && a.index < b.index;
+  };
+  std::vector<Entry> kept(entries.begin(), entries.begin() + static_cast<std::ptrdiff_t>(most));
+  std::make_heap(kept.begin(), kept.end(), isBefore);
+  for (size_t i = most; i < entries.size(); ++i) {
+    checkWork();
+    if (!isBefore(entries[i], kept.front())) continue;
+    std::pop_heap(kept.begin(), kept.end(), isBefore);
+    kept.back() = entries[i];
+    std::push_heap(kept.begin(), kept.end(), isBefore);
+  }
+  std::sort_heap(kept.begin(), kept.end(), isBefore);
+  entries.swap(kept);
+}
+
+}  // namespace
+
 bool XQueryFLWORSort(XQuerySortList& list, bool ascending, bool emptyLeast) {
+  return XQueryFLWORSortFirst(list, ascending, emptyLeast, SIZE_MAX);
+}
+
+bool XQueryFLWORSortFirst(XQuerySortList& list, bool ascending, bool emptyLeast, size_t most) {
   if (list.items.size() < 2) return true;
   KeyOrder order(list, ascending, emptyLeast);
   RankedOrder ranked(list, order);
   std::vector<Entry> entries = ranked.entries();
-  stableMergeSort(entries, [&](const Entry& a, const Entry& b) { return ranked.isBefore(a, b); });
+  // For more of them the heap is no quicker than sorting.
+  constexpr size_t part = 8;
+  if (most > 0 && most <= entries.size() / part && ranked.isTotal()) {
+    keepFirst(entries, most, ranked);
+  } else {
+    stableMergeSort(entries, [&](const Entry& a, const Entry& b) { return ranked.isBefore(a, b); });
+  }
   std::vector<XQuerySortItem> sorted;
   sorted.reserve(entries.size());
   WorkPacer pacer;

@@ -32,6 +32,9 @@ struct XQuerySortList {
 // keys that was compared could be compared.
 bool XQueryFLWORSort(XQuerySortList& list, bool ascending, bool emptyLeast);
 
+// The same where only the first `most` items are wanted: the others may be left out.
+bool XQueryFLWORSortFirst(XQuerySortList& list, bool ascending, bool emptyLeast, size_t most);
+
 // The same by looking at both keys anew for every comparison: what the shortcut must agree with.
 bool XQueryFLWORSortPlainly(XQuerySortList& list, bool ascending, bool emptyLeast);
 

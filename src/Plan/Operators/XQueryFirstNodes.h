@@ -1,6 +1,7 @@
 // A path of whose nodes only the first ones are asked for, by who stands around it.
 #pragma once
 
+#include "Expr/Clauses/XQueryFLWOR.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
 #include "Plan/Paths/XQueryWalkedPath.h"
 
@@ -28,6 +29,28 @@ class XQueryFirstNodes : public XQueryPlannedExpr {
 
  private:
   const Ref<XQueryWalkedPath> _path;
+  const uint64_t _most;
+};
+
+// The same for a FLWOR with order specs, of whose items only the first ones are asked for.
+class XQueryFirstSorted : public XQueryPlannedExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryFirstSorted> exprWithPlain(Ref<XQueryFLWORExpr> plain,
+                                                            uint64_t most) {
+    return make<XQueryFirstSorted>(std::move(plain), most);
+  }
+
+  Value computeValue(XQueryContext& context) const override {
+    return cast<XQueryFLWORExpr>(&plain())->firstItems(_most, context);
+  }
+
+ protected:
+  XQueryFirstSorted(Ref<XQueryFLWORExpr> plain, uint64_t most)
+      : XQueryPlannedExpr(std::move(plain)), _most(most) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
   const uint64_t _most;
 };
 
