@@ -503,7 +503,11 @@ class ProgramGenerator {
       return "for $u in " + many() + " order by " + keys + " return " +
              _random.oneOf({"$u", "($u/@x, $u)", "<b>{$u/@x}</b>", "string($u)", expr(depth - 1)});
     });
-    const std::string list = _random.below(3) ? sorted : path(depth - 1);
+    const std::string unsorted = within("$u", [&] {
+      return "for $u in " + many() + " where " + match("$u") + " return " +
+             _random.oneOf({"$u", "($u/@x, $u)", "string($u)"});
+    });
+    const std::string list = _random.oneOf({sorted, sorted, unsorted, path(depth - 1)});
     const std::string part =
         _random.oneOf({"[1]", "[2]", "[position() <= 3]", "[position() lt 3]", "[last()]"});
     switch (_random.below(4)) {

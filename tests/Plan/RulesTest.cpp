@@ -350,6 +350,25 @@ TEST(TakeFirst, SortsNoMoreThanIsAskedFor) {
   }
 }
 
+TEST(TakeFirst, EndsWithTheTuplesThatAreAskedFor) {
+  for (const char* text :
+       {"(for $a in //a where $a/c return $a/b)[1]",
+        "subsequence(for $a in //a, $b in $a/b return ($b, $a), 2, 3)",
+        "let $l := for $a in //a return ($a/@x, $a) return ($l[1], $l[position() < 3])"}) {
+    EXPECT_EQ(operatorsOf("first", text), 1U) << text;
+    EXPECT_LT(stepsOf(text), 100) << text;
+    resultOf(text, manyNames());
+    resultOf(text, names());
+  }
+  for (const char* text :
+       {"(for $a in //a return xs:integer($a/@x))[1]", "(for $a in //a return <n/>)[1]",
+        "(for $a in //a return trace($a, 't'))[1]", "(for $a in //a return $a)[last()]",
+        "((for $a in //a return $a)[1], some $y in //none satisfies $y, $y)"}) {
+    EXPECT_EQ(operatorsOf("first", text), 0U) << text;
+    resultOf(text, names());
+  }
+}
+
 TEST(TakeFirst, LeavesAloneWhatMayComeInAnotherOrder) {
   for (const char* text :
        {"(//a/b)[1]", "(//a/ancestor::*)[1]", "subsequence(//a//b, 1, 1)", "(//b/..)[1]",

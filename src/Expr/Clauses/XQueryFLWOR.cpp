@@ -24,8 +24,10 @@ struct XQueryFLWORResults {
   XQueryGatherer values;
   std::optional<XQueryItemTally> tally;
   XQuerySortList sortList;
+  uint64_t wanted = UINT64_MAX;  // so many items at most, without order specs
+  uint64_t gathered = 0;         // of them
 
-  bool areComplete() const { return tally && tally->isComplete(); }
+  bool areComplete() const { return gathered >= wanted || (tally && tally->isComplete()); }
 };
 
 // --- clauses -------------------------------------------------------------------------------------
@@ -249,8 +251,9 @@ bool XQueryFLWORExpr::addTuple(const XQueryExpr* returned, XQueryFLWORResults& t
     toResults.tally->add(value);
     return !toResults.areComplete();
   }
+  if (toResults.wanted != UINT64_MAX) toResults.gathered += XQueryItemList(value.get()).count();
   toResults.values.add(std::move(value));
-  return true;
+  return !toResults.areComplete();
 }
 
 // Adds every item of the value with the keys of the tuple.
@@ -291,7 +294,8 @@ Value XQueryFLWORExpr::computeValue(XQueryContext& context) const {
 Value XQueryFLWORExpr::firstItems(uint64_t most, XQueryContext& context) const {
   XQueryFLWORResults results;
   results.sortList.keyCount = _orderSpecs.size();
-  if (!evaluateStartingAt(0, results, context)) return {};
+  results.wanted = _orderSpecs.empty() ? most : UINT64_MAX;
+  if (!evaluateStartingAt(0, results, context) && !results.areComplete()) return {};
   if (_orderSpecs.empty()) return results.values.value();
 
   const XQueryOrderSpec& first = *_orderSpecs.front();

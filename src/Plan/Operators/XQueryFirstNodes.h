@@ -32,12 +32,12 @@ class XQueryFirstNodes : public XQueryPlannedExpr {
   const uint64_t _most;
 };
 
-// The same for a FLWOR with order specs, of whose items only the first ones are asked for.
-class XQueryFirstSorted : public XQueryPlannedExpr {
+// The same for a FLWOR. One without order specs ends as soon as it has so many items.
+class XQueryFirstTuples : public XQueryPlannedExpr {
  public:
-  [[nodiscard]] static Ref<XQueryFirstSorted> exprWithPlain(Ref<XQueryFLWORExpr> plain,
+  [[nodiscard]] static Ref<XQueryFirstTuples> exprWithPlain(Ref<XQueryFLWORExpr> plain,
                                                             uint64_t most) {
-    return make<XQueryFirstSorted>(std::move(plain), most);
+    return make<XQueryFirstTuples>(std::move(plain), most);
   }
 
   Value computeValue(XQueryContext& context) const override {
@@ -45,7 +45,7 @@ class XQueryFirstSorted : public XQueryPlannedExpr {
   }
 
  protected:
-  XQueryFirstSorted(Ref<XQueryFLWORExpr> plain, uint64_t most)
+  XQueryFirstTuples(Ref<XQueryFLWORExpr> plain, uint64_t most)
       : XQueryPlannedExpr(std::move(plain)), _most(most) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);

@@ -14,18 +14,19 @@
 //             item each (XQueryFLWORExpr::Yield)
 // Why         what is not walked could only have found more items; the truth of nodes is that there
 //             are any
-#include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Plan/Operators/XQueryItemCount.h"
 #include "Plan/Operators/XQueryPathCount.h"
 #include "Plan/Paths/XQueryWalkedPath.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/EarlyEnds.h"
 #include "Plan/Rules/NumberQuestions.h"
 #include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/PositionConditions.h"
 
 #include <optional>
+#include <string_view>
 
 namespace xquery {
 namespace {
@@ -109,27 +110,14 @@ class Search {
     }
     const XQueryFacts& facts = _planning.facts[counted];
     if (!XQueryCountsItems(*items) || (asksForTruth && !facts.are(XQueryItems::Node))) return false;
-    _planning.wrap(place,
-                   XQueryItemCount::exprWithPlain(plain, items, question, mayEndEarly(counted)));
+    const bool mayEndEarly = XQueryMayEndEarly(_planning, counted);
+    const std::string_view reason =
+        question.least == 0 || mayEndEarly
+            ? ""
+            : "items are counted to the end, since what is behind may fail, or could be told";
+    _planning.wrap(place, XQueryItemCount::exprWithPlain(plain, items, question, mayEndEarly),
+                   reason);
     return true;
-  }
-
-  // Whether what is behind the answer does nothing and cannot fail. What the first clause of a
-  // FLWOR walks is always evaluated, once.
-  bool mayEndEarly(XQueryPlaceID place) const {
-    using namespace XQueryDeeds;
-    const XQueryFacts& facts = _planning.facts[place];
-    if (!facts.isRepeatable() || facts.does(LoadsDocuments)) return false;
-    if (_planning.showsLeftovers(facts.assigns, place)) return false;
-    if (!facts.does(MayFail)) return true;
-    if (at(place)->kind() != Kind::FLWORExpr) return false;
-    const XQueryPlaceID first = _planning.program.firstPart(place);
-    const auto* clause = dyn_cast<XQueryForExpr>(at(first));
-    if (!clause || clause->type()) return false;
-    XQueryPlaceID part = first;
-    do part = _planning.program.nextPart(part);
-    while (part != XQueryNoPlace && !_planning.facts[part].does(MayFail));
-    return part == XQueryNoPlace;
   }
 
   bool lookAtCall(XQueryPlaceID place) {

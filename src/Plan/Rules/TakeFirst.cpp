@@ -5,12 +5,13 @@
 //             a variable that "let" sets to E, where every use of it is such; for $x at $i in E ...
 //             where $i <= 3 ...
 // Facts       E is a path that finds its nodes in document order from one node, and that can be
-//             walked in part (XQueryWalkedPath::findsInOrder), or a FLWOR with order specs; clauses
+//             walked in part (XQueryWalkedPath::findsInOrder), a FLWOR with order specs, or one of
+//             which what is behind an item cannot fail and does nothing (EarlyEnds.h); clauses
 //             declare no types; those between "at $i" and the condition are repeatable and cannot
 //             fail; what is left in their variables cannot be told
 // Operator    XQueryFirstNodes for a path: the walk ends at the last node that can be asked for.
-//             XQueryFirstSorted for a FLWOR: only so many are put into their order, once everything
-//             has been evaluated
+//             XQueryFirstTuples for a FLWOR: only so many are put into their order, once everything
+//             has been evaluated, or no more tuples are made than that takes
 // Why         what is behind these items cannot be told from what is not there, since the whole
 // asks
 //             neither for it nor for the number of items. Whether keys can be compared is found out
@@ -25,6 +26,7 @@
 #include "Plan/Operators/XQueryFirstNodes.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/EarlyEnds.h"
 #include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/PositionConditions.h"
@@ -135,9 +137,13 @@ class Search {
       return;
     }
     if (auto* flwor = dyn_cast<XQueryFLWORExpr>(_program[place].expr)) {
-      if (flwor->orderSpecs().empty()) return;
+      const bool mayEndEarly =
+          XQueryMayEndEarly(_planning, place) && !_planning.facts[place].mayBe(XQueryItems::Other);
+      if (flwor->orderSpecs().empty() && !mayEndEarly) {
+        return _planning.refuse(place, "what is behind the first items may fail, or could be told");
+      }
       return _planning.wrap(place,
-                            XQueryFirstSorted::exprWithPlain(Ref<XQueryFLWORExpr>(flwor), most));
+                            XQueryFirstTuples::exprWithPlain(Ref<XQueryFLWORExpr>(flwor), most));
     }
     XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, place);
     if (!path) return;
