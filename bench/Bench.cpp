@@ -1,5 +1,6 @@
-// xquery_bench [--factor=F] [--scaling | --functions | --threads | --reading] [Google Benchmark
-// options] xquery_bench [--factor=F] --phrasings [--limit=SECONDS] [--ideas=TEXT]
+// xquery_bench [--factor=F] [--scaling | --functions | --threads[=TEXT] | --reading]
+//              [Google Benchmark options]
+// xquery_bench [--factor=F] --phrasings [--limit=SECONDS] [--ideas=TEXT]
 //
 // Measures the tree build, single steps (some with the memory that each takes at the peak), a table
 // of paths, each beside the peer's figure from the same run, and the twenty numbered queries of
@@ -265,7 +266,11 @@ std::optional<Options> takeOptions(int& argc, char** argv) {
 int main(int argc, char** argv) {
   if (argc == 3 && std::strcmp(argv[1], "--peak") == 0) return bench::reportPeak(argv[2]);
   if (argc == 2 && std::strcmp(argv[1], "--functions") == 0) return bench::reportFunctions();
-  if (argc == 2 && std::strcmp(argv[1], "--threads") == 0) return bench::reportThreads();
+  if (const std::string_view only = argc == 2 ? argv[1] : ""; only == "--threads") {
+    return bench::reportThreads("");
+  } else if (constexpr std::string_view some = "--threads="; only.starts_with(some)) {
+    return bench::reportThreads(only.substr(some.size()));
+  }
   const std::optional<Options> options = takeOptions(argc, argv);
   if (!options) {
     std::fprintf(stderr, "the factor must be above 0 and at most 15, the limit above 0\n");
