@@ -2,6 +2,7 @@
 #include "Types/XQueryNodeFunctions.h"
 
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
 #include "Types/XQueryNumber.h"
 
 #include <unordered_map>
@@ -286,8 +287,12 @@ Ref<NSXMLNode> XQueryXMLNodeComment(const NSString& text) {
 }
 
 Ref<NSXMLNode> XQueryXMLNodePI(const NSString& target, const NSString& text) {
-  if (isXMLTarget(target.view())) return nullptr;
-  return NSXMLNode::processingInstructionWithName(target.view(), text.view());
+  return XQueryXMLNodePI(NSXMLNameRef(target.view(), NSStringView()), text.view());
+}
+
+Ref<NSXMLNode> XQueryXMLNodePI(NSXMLNameRef target, NSStringView text) {
+  if (isXMLTarget(target->text)) return nullptr;
+  return NSXMLTree::makeLoneNode(Kind::ProcessingInstruction, text, target.detach());
 }
 
 Ref<NSXMLNode> XQueryXMLNodeAttribute(const NSString& name, const NSString& value) {

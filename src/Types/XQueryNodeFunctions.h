@@ -2,6 +2,7 @@
 // or false.
 #pragma once
 
+#include "Platform/Tree/Names.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
@@ -37,6 +38,7 @@ Ref<NSXMLNode> XQueryXMLNodeCDATA(const NSString& text);
 Ref<NSXMLNode> XQueryXMLNodeComment(const NSString& text);
 // Null for the target "xml" in any letter case.
 Ref<NSXMLNode> XQueryXMLNodePI(const NSString& target, const NSString& text);
+Ref<NSXMLNode> XQueryXMLNodePI(NSXMLNameRef target, NSStringView text);
 Ref<NSXMLNode> XQueryXMLNodeAttribute(const NSString& name, const NSString& value);
 Ref<NSXMLNode> XQueryXMLNodeNamespace(const NSString& prefix, const NSString& URI);
 bool XQueryNamespacesEqual(NSStringView a, NSStringView b);

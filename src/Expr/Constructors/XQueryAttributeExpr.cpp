@@ -52,7 +52,7 @@ Value XQueryAttributeExpr::computeValue(XQueryContext& context) const {
   NSXMLNameRef name = attributeName(_name, context, exprLine());
   NSMutableString text;
   if (!name || !appendValueText(text, context)) return {};
-  return Ref<NSXMLNode>(NSXMLTree::makeLoneAttribute(name.detach(), text.view()));
+  return Ref<NSXMLNode>(NSXMLTree::makeLoneNode(Kind::Attribute, text.view(), name.detach()));
 }
 
 bool XQueryAttributeExpr::addTo(XQueryElementContent& content, XQueryContext& context) const {
@@ -110,8 +110,9 @@ Value XQueryComputedAttributeExpr::computeValue(XQueryContext& context) const {
     XQueryAppendText(value, text, context);
   }
   XQueryNormalizeAttributeString(text);
-  return Ref<NSXMLNode>(_isInPlace ? NSXMLTree::makeAttributeInPlace(name.detach(), text.view())
-                                   : NSXMLTree::makeLoneAttribute(name.detach(), text.view()));
+  return Ref<NSXMLNode>(_isInPlace
+                            ? NSXMLTree::makeAttributeInPlace(name.detach(), text.view())
+                            : NSXMLTree::makeLoneNode(Kind::Attribute, text.view(), name.detach()));
 }
 
 }  // namespace xquery

@@ -73,10 +73,20 @@ void XQueryConstructorName::bindUnresolved(XQueryProlog& prolog, int64_t line) {
   _waitsForContext = true;
 }
 
+// A target is written as a literal string, which is cast to a QName. Without a prefix that needs
+// nothing of the context, and of the QName only the local name, which is the text, is used.
+void XQueryConstructorName::bindTarget() {
+  const auto* literal = dyn_cast<XQueryLiteral>(_nameExpr.get());
+  const auto* text = literal ? dyn_cast<NSString>(literal->literalValue()) : nullptr;
+  if (!text || text->view().find(u':') != NSStringView::notFound) return;
+  if (XQueryIsNodeName(text->view())) _constant = NSXMLNameRef(text->view(), NSStringView());
+}
+
 void XQueryConstructorName::bind(XQueryProlog& prolog, Kind nodeKind, int64_t line) {
   _nodeKind = nodeKind;
   if (_nameExpr || !_name) {
     if (_nameExpr) _nameExpr->bindInfoForProlog(prolog);
+    if (nodeKind == Kind::ProcessingInstruction) bindTarget();
   } else if (const Ref<XQueryQName> qName = resolved(prolog, nodeKind)) {
     _nameExpr = XQueryQNameReference::qNameReferenceWithQName(qName, line);
     _constant = nodeName(*qName);

@@ -36,6 +36,7 @@ class XQueryConstructorName {
 
  private:
   Ref<XQueryQName> resolved(const XQueryProlog& prolog, Kind nodeKind) const;
+  void bindTarget();
   void bindUnresolved(XQueryProlog& prolog, int64_t line);
   bool isConstantIn(XQueryContext& context) const;
 

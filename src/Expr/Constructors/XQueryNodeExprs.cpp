@@ -80,6 +80,14 @@ XQueryProcessingInstructionExpr::processingInstructionExprWithName(Ref<XQueryExp
   return make<XQueryProcessingInstructionExpr>(std::move(name), std::move(value));
 }
 
+// A target is in no namespace. The name itself serves mostly, which the compiled query holds, so
+// that threads need not look it up in the table that they share.
+NSXMLNameRef XQueryProcessingInstructionExpr::targetNamed(const NSXMLNameRef& name) {
+  const NSXMLExpandedName& expanded = *name->expanded;
+  if (name->prefixLength == 0 && !expanded.URI) return name;
+  return {expanded.localName, NSStringView()};
+}
+
 void XQueryProcessingInstructionExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
   _name.bind(prolog, Kind::ProcessingInstruction, exprLine());
@@ -96,16 +104,13 @@ Value XQueryProcessingInstructionExpr::computeValue(XQueryContext& context) cons
   auto& dynamic = context._internal();
   const NSXMLNameRef name = _name.evaluate(context, exprLine());
   if (!name) return {};
-  const Ref<NSString> target = NSString::stringWithView(name->expanded->localName);
   NSMutableString content;
   if (appendTextOf(_value, content, context) == Part::Failed) return {};
   if (content.view().find(NSStringView::ascii("?>")) != NSStringView::notFound) {
     return dynamic.fail(XQueryErrors::invalidInstruction.errorAtLine(exprLine()));
   }
-  Ref<NSXMLNode> instruction;
-  if (target->length() > 0) {
-    instruction = XQueryXMLNodePI(*target, *XQueryStringTrimLeadingWS(content.string()));
-  }
+  const Ref<NSXMLNode> instruction =
+      XQueryXMLNodePI(targetNamed(name), XQueryStringTrimLeadingWS(content.string())->view());
   if (!instruction) return dynamic.fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
   dynamic.setBaseURI(dynamic.baseURI(), instruction.get());
   return instruction;

@@ -74,6 +74,8 @@ class XQueryProcessingInstructionExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  static NSXMLNameRef targetNamed(const NSXMLNameRef& name);
+
   XQueryConstructorName _name;
   Ref<XQueryExpr> _value;
 };

@@ -334,8 +334,7 @@ NSXMLNode* NSXMLTree::makeLoneNode(Kind kind, NSStringView text) {
 
 NSXMLNode* NSXMLTree::makeLoneNode(Kind kind, NSStringView text, NSStringView name,
                                    NSStringView URI) {
-  return NewTree().withNamed(NSXMLInternName(name, URI),
-                             [&](NSXMLTree& tree) { return tree.makeNode(kind, text); });
+  return makeLoneNode(kind, text, NSXMLInternName(name, URI));
 }
 
 NSXMLElement* NSXMLTree::makeLoneElement(NSStringView name, NSStringView URI) {
@@ -384,9 +383,8 @@ NSXMLNode* NSXMLTree::makeNode(Kind kind, NSStringView text, NSXMLRoom& room) {
   return node;
 }
 
-NSXMLNode* NSXMLTree::makeLoneAttribute(const NSXMLName* name, NSStringView text) {
-  return NewTree().withNamed(name,
-                             [&](NSXMLTree& tree) { return tree.makeNode(Kind::Attribute, text); });
+NSXMLNode* NSXMLTree::makeLoneNode(Kind kind, NSStringView text, const NSXMLName* name) {
+  return NewTree().withNamed(name, [&](NSXMLTree& tree) { return tree.makeNode(kind, text); });
 }
 
 // --- nodes that are being filled --------------------------------------------------------------

@@ -128,7 +128,8 @@ class NSXMLTree : public NSXMLTreeHead {
   static constexpr size_t roomForNode = sizeof(NSXMLNode);
   // What a text takes behind a node.
   static constexpr size_t roomForText(size_t bytes) { return (bytes + 7) & ~size_t{7}; }
-  [[nodiscard]] static NSXMLNode* makeLoneAttribute(const NSXMLName* name, NSStringView text);
+  // The tree takes over one count of the name.
+  [[nodiscard]] static NSXMLNode* makeLoneNode(Kind kind, NSStringView text, const NSXMLName* name);
 
   // Distances of nodes from the heads of their blocks are 16-bit counts of so many bytes.
   static constexpr size_t distanceUnit = 8;
