@@ -2,6 +2,7 @@
 
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Tree/Credit.h"
+#include "Types/XQueryDate.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"
 
@@ -21,6 +22,9 @@ bool isShortText(const NSObject* object) {
 Ref<NSCounted> copyOf(const NSObject* object) {
   const LastingObjects lasting;
   if (const auto* number = dyn_cast<XQueryNumber>(object)) return XQueryNumber::copyOf(*number);
+  if (const auto* date = dyn_cast<XQueryDate>(object)) {
+    return XQueryDate::xqueryDateWithInstant(date->instant(), date->timeZone(), date->typeID());
+  }
   return XQueryString::stringWithView(cast<XQueryString>(object)->view());
 }
 
@@ -30,7 +34,7 @@ Ref<NSCounted> copyOf(const NSObject* object) {
 uint32_t XQueryLiteralCopies::placeOf(const NSObject* stored) {
   if (!stored) return anyPlace;
   if (stored->isNode()) return inTree;
-  const bool isCopied = isa<XQueryNumber>(stored) || isShortText(stored);
+  const bool isCopied = isa<XQueryNumber>(stored) || isa<XQueryDate>(stored) || isShortText(stored);
   return isCopied && !cast<NSCounted>(stored)->isImmortal() ? threadPlace() : anyPlace;
 }
 

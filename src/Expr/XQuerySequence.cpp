@@ -7,9 +7,9 @@
 
 namespace xquery {
 
-Ref<XQuerySequence> XQuerySequence::sequenceWithItem(const Value& item) {
+Ref<XQuerySequence> XQuerySequence::sequenceWithItem(Value item) {
   auto sequence = XQuerySequence::sequence();
-  sequence->addObject(item);
+  sequence->addObject(std::move(item));
   return sequence;
 }
 
@@ -37,6 +37,27 @@ void XQuerySequence::addObject(const Value& item) {
       addOne(top.array->objects()[top.next++]);
     } else {
       open.pop_back();
+    }
+  }
+}
+
+void XQuerySequence::addObject(Value&& item) {
+  Value taken = std::move(item);
+  if (!taken || isNull(taken)) return;
+  auto* array = dyn_cast<NSArray>(taken.get());
+  if (!array) {
+    _objects.push_back(std::move(taken));
+  } else if (!array->hasOneReference()) {
+    addObject(taken);
+  } else {
+    WorkPacer pacer;
+    for (Value& each : array->objects()) {
+      pacer.turn();
+      if (isa<NSArray>(each)) {
+        addObject(each);
+      } else if (each && !isNull(each)) {
+        _objects.push_back(std::move(each));
+      }
     }
   }
 }
@@ -82,10 +103,10 @@ Value flattened(Value value) {
 void XQueryGatherer::add(Value value) {
   if (!value || isNull(value)) return;
   if (_sequence) {
-    _sequence->addObject(value);
+    _sequence->addObject(std::move(value));
   } else if (_first) {
     _sequence = XQuerySequence::sequenceWithItem(std::exchange(_first, Value()));
-    _sequence->addObject(value);
+    _sequence->addObject(std::move(value));
   } else {
     _first = std::move(value);
   }

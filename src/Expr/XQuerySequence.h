@@ -16,9 +16,11 @@ class XQuerySequence : public NSArray {
   static bool classof(const NSObject& object) { return object.kind() == Kind::Sequence; }
 
   [[nodiscard]] static Ref<XQuerySequence> sequence() { return make<XQuerySequence>(); }
-  [[nodiscard]] static Ref<XQuerySequence> sequenceWithItem(const Value& item);
+  [[nodiscard]] static Ref<XQuerySequence> sequenceWithItem(Value item);
 
   void addObject(const Value& item);
+  // Takes over the item, or those of an array that nobody else holds.
+  void addObject(Value&& item);
   // Ignores null and NSNull and does not flatten; into an empty sequence the index is not looked
   // at, past the end it appends.
   void insertObject(const Value& item, size_t atIndex);

@@ -18,7 +18,8 @@ namespace xquery {
 namespace {
 
 Value asString(Ref<NSString> text, XQueryContext& context) {
-  return XQueryCastAsTypeForContext(text ? text : NSString::empty(), XQueryTypeString, context);
+  return XQueryCastAsTypeForContext(text ? std::move(text) : NSString::empty(), XQueryTypeString,
+                                    context);
 }
 
 // A name of the item as a string: "" for the empty sequence and for a node without that name, null

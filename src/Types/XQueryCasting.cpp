@@ -458,6 +458,8 @@ Value XQueryCastAs(const Value& object, XQueryTypeID type, XQueryContext& forCon
 
 Value XQueryCastObject(const Value& object, XQueryTypeID asType, XQueryContext& forContext,
                        bool allowEmpty) {
+  // Atomizing it would give the item itself.
+  if (XQueryIsAtomicType(object.get())) return XQueryCastAs(object, asType, forContext);
   const int occurrence = allowEmpty ? XQueryOccurrenceAnyAlso : XQueryOccurrenceExactlyOne;
   Value item = XQueryAtomizationCheckingOccurrence(object, occurrence, forContext);
   if (allowEmpty && isa<NSNull>(item)) return item;

@@ -7,6 +7,7 @@
 
 #include <unordered_map>
 #include <unordered_set>
+#include <utility>
 
 namespace xquery {
 
@@ -42,7 +43,7 @@ const NSXMLNode* attributeNamed(const NSXMLNode* node, std::string_view name) {
 }
 
 Ref<NSString> textOrEmpty(Ref<NSString> text) {
-  return text ? text : NSString::empty();
+  return text ? std::move(text) : NSString::empty();
 }
 
 bool sameNameAndText(const NSXMLNode* a, const NSXMLNode* b) {

@@ -1,4 +1,5 @@
 #include "Expr/LiteralCopies.h"
+#include "Types/XQueryDate.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"
 #include "xquery/xquery.h"
@@ -34,6 +35,8 @@ TEST(LiteralCopies, OtherThreadsGetOneOfTheirOwnWithoutCountingTheStoredOne) {
       XQueryNumber::numberWithDecimal(NSDecimal(8)),
       XQueryNumber::numberWithDouble(1.5),
       XQueryString::stringWithView(NSStringView::ascii("a text of more than twenty-four units")),
+      XQueryDate::xqueryDateFromString(NSStringView::ascii("2004-05-06")),
+      XQueryDate::xqueryDateTimeFromString(NSStringView::ascii("2004-05-06T07:08:09.5+01:30")),
   };
   for (const Value& value : values) {
     const XQueryLiteralCopies copies(value);

@@ -269,9 +269,13 @@ bool XQueryFLWORExpr::addSortItems(Value value, XQuerySortList& toList,
     }
     toList.keys.push_back(std::move(key));
   }
-  const Value flat = flattened(std::move(value));
+  Value flat = flattened(std::move(value));
   const XQueryItemList items(flat.get());
   if (items.count() == 0) toList.keys.resize(sortInfo);
+  if (items.count() == 1 && !isa<NSArray>(flat)) {
+    toList.items.push_back({std::move(flat), sortInfo, 0});
+    return true;
+  }
   WorkPacer pacer;
   for (size_t i = 0; i < items.count(); ++i) {
     pacer.turn();

@@ -322,10 +322,10 @@ constexpr Row rows[] = {
 };
 
 // A node becomes its untyped value, and an untyped value a number.
-Value asNumberIfUntyped(const Value& operand, XQueryTypeID numberType, XQueryContext& context) {
-  const Value atomic = XQueryIsNode(operand.get()) ? XQueryAtomization(operand, context) : operand;
-  if (XQueryObjectTypeID(atomic.get()) != XQueryTypeUntypedAtomic) return atomic;
-  return XQueryCastAsTypeForContext(atomic, numberType, context);
+void makeNumberIfUntyped(Value& operand, XQueryTypeID numberType, XQueryContext& context) {
+  if (XQueryIsNode(operand.get())) operand = XQueryAtomization(operand, context);
+  if (XQueryObjectTypeID(operand.get()) != XQueryTypeUntypedAtomic) return;
+  operand = XQueryCastAsTypeForContext(operand, numberType, context);
 }
 
 bool isOrderedDuration(const Value& value) {
@@ -358,8 +358,8 @@ Value XQueryOperatorExpr::arithmeticOperatorEvaluate(int type, const Value& with
   if (isNull(a) || isNull(b)) return NSNull::null();
   if (isa<NSArray>(a) || isa<NSArray>(b)) return Value();
   const XQueryTypeID untypedAs = type == XQueryOperatorIDiv ? XQueryTypeInteger : XQueryTypeDouble;
-  a = asNumberIfUntyped(a, untypedAs, forContext);
-  b = asNumberIfUntyped(b, untypedAs, forContext);
+  makeNumberIfUntyped(a, untypedAs, forContext);
+  makeNumberIfUntyped(b, untypedAs, forContext);
   if (dividesByZero(type, a, b)) return XQueryErrors::divideByZero.error();
   const XQueryTypeID leftType = XQueryObjectTypeID(a.get());
   const XQueryTypeID rightType = XQueryObjectTypeID(b.get());
@@ -376,7 +376,7 @@ Value XQueryUnarySign(int type, const Value& operand, XQueryContext& context) {
   if (!number) return Value();
   if (isNull(number)) return NSNull::null();
   if (isa<NSArray>(number)) return Value();
-  number = asNumberIfUntyped(number, XQueryTypeDouble, context);
+  makeNumberIfUntyped(number, XQueryTypeDouble, context);
   const XQueryTypeID numberType = XQueryObjectTypeID(number.get());
   if (!XQueryIsNumericTypeID(numberType)) return Value();
   const NumericWork& work = type == XQueryOperatorMinus ? subtraction : addition;
