@@ -87,7 +87,9 @@ class ProgramGenerator {
   }
 
   std::string predicate(int depth) {
-    switch (_random.below(10)) {
+    switch (_random.below(11)) {
+      case 10:
+        return "[" + computedPosition(depth) + "]";
       case 0:
         return "[" + _random.oneOf({"1", "2", "last()", "position() < 3", "position() = 1"}) + "]";
       case 1:
@@ -104,6 +106,14 @@ class ProgramGenerator {
       default:
         return "[" + comparison(depth - 1) + "]";
     }
+  }
+
+  // A number that may be the same for all items, not be there, or fail.
+  std::string computedPosition(int depth) {
+    const std::string number =
+        _random.oneOf({"count(" + path(depth - 1) + ")", "number(" + variable() + ")", variable(),
+                       "xs:integer('u')", "position()", "sum((1, 0.5))"});
+    return number + _random.oneOf({" + 1", " - 1", " * 1.5", " + last()", " idiv 0", " mod 3"});
   }
 
   std::string nameCondition() {

@@ -22,7 +22,8 @@ using namespace plantest;
 size_t operatorsIn(std::string_view text) {
   static const std::set<std::string_view> others = {"texts",    "short paths",  "constants",
                                                     "counts",   "sets",         "walks",
-                                                    "operands", "constructors", "lists"};
+                                                     "operands", "constructors", "lists",
+                                                     "nearby nodes"};
   return choicesIn(text, [](std::string_view rule) {
     return !others.contains(rule) && !rule.ends_with("-joins");
   });
@@ -249,15 +250,40 @@ TEST(CountPaths, TakesOverWhereOnlyTheNumberMatters) {
     EXPECT_GE(operatorsOf("counts", text), 1U) << text;
     resultOf(text, names());
   }
-  for (const char* condition :
-       {"count(*) > 0", "count(*) >= 2", "2 > count(*)", "count(*) = 0", "0 ne count(*)",
-        "count(*) le 1", "b", "b and @x", "b or @z", "not(b)", "ancestor::c"}) {
+  for (const char* condition : {"count(*) > 0",
+                                "count(*) >= 2",
+                                "2 > count(*)",
+                                "count(*) = 0",
+                                "0 ne count(*)",
+                                "count(*) le 1",
+                                "b",
+                                "b and @x",
+                                "b or @z",
+                                "not(b)",
+                                "ancestor::c",
+                                "*[2]",
+                                "not(b[2])",
+                                "b[1] or c[2]",
+                                "ancestor::node()[3]",
+                                "@*[2]",
+                                "*[2.7]",
+                                "*[0]",
+                                "exists(./*[2])",
+                                "count(*[2]) > 0",
+                                "count(*[2]) > 1",
+                                "*/b[2]",
+                                "*[2]/b",
+                                "*[2][1]",
+                                "*[last()]"}) {
     const std::string text = std::string("//*[") + condition + "]";
     EXPECT_GE(operatorsOf("counts", text), 1U) << text;
     resultOf(text, names());
+    resultOf(text, manyNames());
   }
   EXPECT_EQ(operatorsOf("counts", "if (//a) then 1 else 2"), 1U);
   EXPECT_EQ(operatorsOf("counts", "for $a in //a where $a/b return 1"), 1U);
+  resultOf("for $a in (//a, 1, 'x', (//a, //b)) where exists($a/*[2]) return 1", names());
+  resultOf("for $a in //a where $a/*[2] return $a/@x", manyNames());
 }
 
 TEST(CountPaths, LeavesOthersAlone) {
@@ -457,6 +483,36 @@ TEST(TakePositions, MakesTheNumberThePredicate) {
     resultOf(text, names());
     resultOf(text, manyNames());
   }
+}
+
+// Worked out once for the nodes of a step, at the first of them.
+TEST(TakePositions, TakesNumbersThatAreTheSameForAllNodes) {
+  const std::string loop = "for $i at $n in (1, 2) return ";
+  for (const char* path :
+       {"/r/a[$n + 1]", "//b[$n + 1]/@y", "//a/b[$n - 5]", "//a/b[$n * 1.4]", "//a[$n + 1][1]",
+        "//c/ancestor::*[$n + 0]", "//b/preceding-sibling::*[$n + 0]", "//a[b]/c[$n idiv 0]",
+        "//none[$n idiv 0]", "//b[xs:integer('x') + $n]", "//a/b[count($i)]",
+        "//*[self::a][$n + 1]", "(//b/../*[$n + 1], 'x')", "count(//a/b[$n + 1])",
+        "exists(//b[$n + 0])"}) {
+    EXPECT_EQ(choicesOf("positions", loop + path), 1U) << path;
+    resultOf(loop + path, names());
+    resultOf(loop + path, manyNames());
+  }
+  for (const char* path : {"//b[$n + last()]", "//a/b[position() + 0]", "//b[count(@y)]",
+                           "//b[($n, 2)]", "//b[$n = 1]", "//a/b[@y][$n + 1]", "(//b)[$n + 1]",
+                           "//b[if ($n = 1) then 1 else @y]", "(//b, 1)/a[$n + 1]"}) {
+    EXPECT_EQ(choicesOf("positions", loop + path), 0U) << path;
+    resultOf(loop + path, names());
+    resultOf(loop + path, manyNames());
+  }
+}
+
+// A recursion that ends where there are no nodes.
+TEST(TakePositions, AsksNothingWithoutNodes) {
+  const char* text =
+      "declare function local:f($e) { count($e/*[local:f($e/*[1]) + 1]) }; local:f(/*)";
+  resultOf(text, names());
+  resultOf(text, manyNames());
 }
 
 // --- members -------------------------------------------------------------------------------------

@@ -92,6 +92,24 @@ bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t posi
   return false;
 }
 
+uint64_t XQueryStep::positionIn(const XQueryExpr& predicate, XQueryContext& context) {
+  auto& dynamic = context._internal();
+  const int64_t position = dynamic.position();
+  const int64_t last = dynamic.last();
+  Value item = dynamic.contextItem();
+  const Value result = predicate.evaluateWithContext(context);
+  if (XQueryHasFailed(result, context)) {
+    if (dynamic.isFailingForGood()) return 0;
+    dynamic.passOverFailure(nullptr);
+    dynamic.setContextItem(std::move(item), position);
+    dynamic.setLast(last);
+    return 0;
+  }
+  if (!result || !XQueryIsNumericType(result.get())) return 0;
+  const auto* number = cast<NSNumber>(result);
+  return number->compare(*XQueryNumber::zero()) > 0 ? number->unsignedIntegerValue() : 0;
+}
+
 std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicate) {
   const XQueryLiteral* literal = literalIn(predicate);
   if (!literal || !XQueryIsNumericType(literal->literalValue().get())) return std::nullopt;

@@ -6,9 +6,18 @@
 
 namespace xquery {
 
-std::optional<uint64_t> XQueryPathCount::countUpTo(uint64_t most, XQueryContext& context) const {
-  NSXMLNode* start = _isShort ? _shortWalk.start(context) : nullptr;
-  return start ? countFrom(start, most) : _path->countNodes(most, context);
+void XQueryPathCount::readShortWalk() {
+  XQueryShortWalk whole;
+  XQueryShortWalk behindPosition;
+  if (whole.readFrom(_path->path())) {
+    _shortWalk = whole;
+    _shortLeast = _question.least;
+    _isShort = true;
+  } else if (_question.least == 1) {
+    _shortLeast = behindPosition.readFromWithPosition(_path->path());
+    _shortWalk = behindPosition;
+    _isShort = _shortLeast > 0;
+  }
 }
 
 uint64_t XQueryPathCount::countFrom(NSXMLNode* node, uint64_t most) const {
@@ -19,14 +28,18 @@ uint64_t XQueryPathCount::countFrom(NSXMLNode* node, uint64_t most) const {
 
 std::optional<bool> XQueryPathCount::holdsFor(NSXMLNode* node, const XQueryContext& context) const {
   if (!_shortWalk.isOpen(context)) return std::nullopt;
-  return (countFrom(node, _question.least) >= _question.least) != _question.isNegated;
+  return holdsFrom(node);
 }
 
 Value XQueryPathCount::computeValue(XQueryContext& context) const {
   // Diagnostics show every error that a predicate meets.
   if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
   const uint64_t least = _question.least;
-  const auto count = countUpTo(least == 0 ? UINT64_MAX : least, context);
+  NSXMLNode* start = _isShort ? _shortWalk.start(context) : nullptr;
+  if (start && least > 0) return NSNumber::numberWithBool(holdsFrom(start));
+  const uint64_t most = least == 0 ? UINT64_MAX : least;
+  const auto count =
+      start ? std::optional(countFrom(start, most)) : _path->countNodes(most, context);
   if (!count) return {};
   if (least == 0) return XQueryNumber::integerWithInt64(static_cast<int64_t>(*count));
   return NSNumber::numberWithBool((*count >= least) != _question.isNegated);

@@ -38,22 +38,26 @@ class XQueryPathCount : public XQueryPlannedExpr, private XQueryNodeQuestion {
 
  protected:
   XQueryPathCount(Ref<XQueryExpr> plain, Ref<XQueryWalkedPath> path, Question question)
-      : XQueryPlannedExpr(std::move(plain)),
-        _path(std::move(path)),
-        _question(question),
-        _isShort(_shortWalk.readFrom(_path->path())) {}
+      : XQueryPlannedExpr(std::move(plain)), _path(std::move(path)), _question(question) {
+    readShortWalk();
+  }
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
   std::optional<bool> holdsFor(NSXMLNode* node, const XQueryContext& context) const override;
+  void readShortWalk();
   uint64_t countFrom(NSXMLNode* node, uint64_t most) const;
-  std::optional<uint64_t> countUpTo(uint64_t most, XQueryContext& context) const;
+  bool holdsFrom(NSXMLNode* node) const {
+    return (countFrom(node, _shortLeast) >= _shortLeast) != _question.isNegated;
+  }
 
   const Ref<XQueryWalkedPath> _path;
   const Question _question;
+  // From one node the short walk finds the same, or so many where the path finds something at all.
+  bool _isShort = false;
   XQueryShortWalk _shortWalk;
-  const bool _isShort;  // from one node the short walk finds the same
+  uint64_t _shortLeast = 0;
 };
 
 }  // namespace xquery

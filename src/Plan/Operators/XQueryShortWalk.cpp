@@ -20,6 +20,11 @@ bool XQueryShortWalk::readFrom(const XQueryExpr& expr) {
     }
     if (!step || !readSteps(step)) return false;
   }
+  return readOrigin(origin);
+}
+
+// Null for the context item.
+bool XQueryShortWalk::readOrigin(const XQueryExpr* origin) {
   if (!origin || isa<XQueryContextItem>(origin)) return true;
   const auto* variable = dyn_cast<XQueryVariable>(origin);
   _varID = variable ? variable->varID() : 0;
@@ -29,13 +34,28 @@ bool XQueryShortWalk::readFrom(const XQueryExpr& expr) {
 bool XQueryShortWalk::readSteps(const XQueryStep* step) {
   for (; step; step = step->next()) {
     const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
-    if (!axisStep || !readStep(*axisStep)) return false;
+    const bool isShort = axisStep && step->predicates().empty() && readStep(*axisStep);
+    if (!isShort) return false;
   }
   return true;
 }
 
+uint64_t XQueryShortWalk::readFromWithPosition(const XQueryPathExpr& path) {
+  const XQueryStep* step = path.step();
+  const XQueryExpr* origin = nullptr;
+  if (step && step->kind() == Kind::FilterStep && step->predicates().empty()) {
+    origin = XQueryWithoutParentheses(step->expr());
+    if (!origin) return 0;
+    step = step->next();
+  }
+  const auto* only = dyn_cast<XQueryAxisStep>(step);
+  if (!only || only->next() || only->predicates().size() != 1) return 0;
+  const auto position = only->literalPosition(0);
+  return position && readOrigin(origin) && readStep(*only) ? *position : 0;
+}
+
 bool XQueryShortWalk::readStep(const XQueryAxisStep& step) {
-  if (_count == mostSteps || !step.predicates().empty()) return false;
+  if (_count == mostSteps) return false;
   // A parent comes first, so that there is one of them.
   const bool isLeading = _count == 0 || _steps[_count - 1].axis == XQueryAxisParent;
   const bool isOpen = step.axis() == XQueryAxisChild || step.axis() == XQueryAxisAttribute ||

@@ -22,6 +22,7 @@
 namespace xquery {
 
 class XQueryExpr;
+class XQueryPathExpr;
 
 class XQueryShortWalk {
  public:
@@ -30,6 +31,10 @@ class XQueryShortWalk {
   // Of a path, or of "." and a local variable alone, in parentheses or not; false for any other
   // expression. Lives no longer than that expression.
   [[nodiscard]] bool readFrom(const XQueryExpr& expr);
+
+  // The same of a path of one step with a literal position and nothing else, "b[6]", without that:
+  // from one node the path finds something when the walk finds so many. 0 for any other path.
+  [[nodiscard]] uint64_t readFromWithPosition(const XQueryPathExpr& path);
 
   // Whether it starts from the context item.
   bool startsFromFocus() const { return _varID == 0; }
@@ -74,6 +79,7 @@ class XQueryShortWalk {
     }
   };
 
+  bool readOrigin(const XQueryExpr* origin);
   bool readStep(const XQueryAxisStep& step);
   static bool goesUp(int axis) {
     return axis == XQueryAxisAncestor || axis == XQueryAxisAncestorOrSelf;

@@ -336,6 +336,10 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
     });
     return first + 1;
   }
+  if (step.computedPosition == first && !listingStep && !step.testMayRaise) {
+    collectComputed(step, axis, node, nodes);
+    return first + 1;
+  }
   const auto walk = [&](auto visit) {
     if (step.trail != XQueryWalkedStep::noTrail && !setsEveryFocus) {
       trail(step.trail).walk(node, axis, visit);
@@ -355,6 +359,21 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
     walk([&test, add](NSXMLNode* found) { return !test.matches(found) || add(found); });
   }
   return first;
+}
+
+// The number is worked out when there is a node to ask it for: without any, it is not evaluated.
+void XQueryPathWalk::collectComputed(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
+                                     std::vector<NSXMLNode*>& nodes) {
+  XQueryStepTest test(step, *this);
+  std::optional<uint64_t> left;
+  XQueryWalkAnyAxis(node, axis, true, [&](NSXMLNode* found) {
+    if (!test.matches(found)) return true;
+    if (!left) left = step.step->positionIn(*step.firstPredicate()->get(), context);
+    if (*left == 0 || --*left > 0) return *left > 0;
+    nodes.push_back(found);
+    return false;
+  });
+  hasFailed = hasFailed || context._internal().isFailing();
 }
 
 }  // namespace xquery

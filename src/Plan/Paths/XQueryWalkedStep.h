@@ -73,6 +73,9 @@ struct XQueryWalkedStep {
   bool countsBelow = false;
   bool filtersEach = false;
   bool gathersFirst = false;
+  // The predicate that is a number, the same for all nodes; noPredicate for none.
+  static constexpr size_t noPredicate = SIZE_MAX;
+  size_t computedPosition = noPredicate;
   size_t trail = noTrail;
 };
 

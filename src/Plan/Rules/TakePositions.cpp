@@ -1,10 +1,14 @@
 // Positions that a step could have been asked for by number.
 //
-// Pattern     a[position() = 3], a[3 eq position()]
-// Facts       the number is an integer, 1 or more; nothing shows the focus that the comparison
-//             leaves (StepsAround.h)
-// Operator    none: the predicate is the number, so that the step walks no further than that
-// Why         a number in a predicate asks for that position
+// Pattern     a[position() = 3], a[3 eq position()]; a[$i + 1]
+// Facts       the number is an integer, 1 or more, or an expression that answers nothing else,
+//             reads no focus and is repeatable; nothing shows the focus that the predicate leaves
+//             (StepsAround.h)
+// Operator    none: the predicate is the number, so that the step walks no further than that; an
+//             expression is evaluated once for the nodes of the step and not for each of them
+// Why         a number in a predicate asks for that position; without nodes it is not evaluated,
+// and
+//             an error in it drops each of them
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Planning.h"
@@ -16,21 +20,62 @@
 
 namespace xquery {
 
-void XQueryTakePositions(XQueryPlanning& planning) {
-  for (XQueryPlaceID place = 0; place < planning.program.placeCount(); ++place) {
-    const XQueryPlace& here = planning.program[place];
-    if (here.role != XQueryRole::Predicate || !planning.isOpen(place)) continue;
-    const XQueryWalkedPath* path =
-        here.parent == XQueryNoPlace ? nullptr : XQueryWalkedPathAt(planning, here.parent);
+namespace {
+
+bool isPositionForAll(const XQueryFacts& facts) {
+  return facts.are(XQueryItems::Numeric) && facts.most <= 1 && facts.isRepeatable() &&
+         facts.assigns.isEmpty() &&
+         !facts.does(XQueryDeeds::ReadsFocus | XQueryDeeds::LoadsDocuments);
+}
+
+class Search {
+ public:
+  explicit Search(XQueryPlanning& planning) : _planning(planning) {}
+
+  void lookAt(XQueryPlaceID place) {
+    const XQueryPlace& here = _planning.program[place];
+    if (here.role != XQueryRole::Predicate || !_planning.isOpen(place) || !here.step) return;
+    if (here.parent == XQueryNoPlace) return;
+    auto* path = XQueryWalkedPathAt(_planning, here.parent);
+    if (!path || !XQueryHidesFocusOf(*here.step, *path, here.parent, _planning)) return;
+    if (!takeNumber(place, *path)) takeExpression(place, *path);
+  }
+
+ private:
+  bool takeNumber(XQueryPlaceID place, const XQueryWalkedPath& path) {
+    const XQueryPlace& here = _planning.program[place];
     const auto asked = XQueryPositionConditionIn(*here.expr);
     const bool isEqual = asked && (asked->comparison == XQueryOperatorEqual ||
                                    asked->comparison == XQueryOperatorEq);
-    if (!path || !isEqual || asked->number < 1) continue;
-    if (!here.step || !XQueryHidesFocusOf(*here.step, *path, here.parent, planning)) continue;
+    if (!isEqual || asked->number < 1) return false;
     auto number = XQueryLiteral::literalWithValue(XQueryNumber::integerWithInt64(asked->number));
     number->setExprLine(here.expr->exprLine());
-    planning.replace(place, std::move(number));
-    const_cast<XQueryPathExpr&>(path->path()).notePositions();
+    _planning.replace(place, std::move(number));
+    const_cast<XQueryPathExpr&>(path.path()).notePositions();
+    return true;
+  }
+
+  // Of the first predicate of an axis step that is no part of its test.
+  void takeExpression(XQueryPlaceID place, XQueryWalkedPath& path) {
+    const XQueryPlace& here = _planning.program[place];
+    if (!isPositionForAll(_planning.facts[place])) return;
+    for (XQueryWalkedStep& step : path.changeableSteps()) {
+      if (step.step != here.step || step.isExpression() || !step.hasPredicates()) continue;
+      if (&*here.slot != &*step.firstPredicate()) continue;
+      step.computedPosition = step.predicatesInTest;
+      _planning.choose(place, "the number is worked out once, and the step walks no further");
+    }
+  }
+
+  XQueryPlanning& _planning;
+};
+
+}  // namespace
+
+void XQueryTakePositions(XQueryPlanning& planning) {
+  Search search(planning);
+  for (XQueryPlaceID place = 0; place < planning.program.placeCount(); ++place) {
+    search.lookAt(place);
   }
 }
 
