@@ -31,6 +31,8 @@ constexpr std::array rules = {
                XQueryTakeFirst},
     XQueryRule{"members", "whether one node is in a large set is looked up in a table",
                XQueryAskMembers},
+    XQueryRule{"nearby nodes", "whether a few steps find one node is asked without a list of all",
+               XQueryFindNearbyNodes},
     XQueryRule{"texts", "comparing children and attributes with a constant makes no values",
                XQueryCompareConstants},
     XQueryRule{"conditions", "several conditions on a node are asked of it as it is",

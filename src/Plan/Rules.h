@@ -38,6 +38,7 @@ void XQueryCountLists(XQueryPlanning& planning);
 void XQueryCountPaths(XQueryPlanning& planning);
 void XQueryTakeFirst(XQueryPlanning& planning);
 void XQueryAskMembers(XQueryPlanning& planning);
+void XQueryFindNearbyNodes(XQueryPlanning& planning);
 void XQueryCompareConstants(XQueryPlanning& planning);
 void XQueryShortenPaths(XQueryPlanning& planning);
 void XQueryAnswerQuickly(XQueryPlanning& planning);

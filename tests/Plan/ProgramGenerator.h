@@ -136,7 +136,9 @@ class ProgramGenerator {
   std::string membership(int depth) {
     const std::string set = _variables.empty() ? "(" + path(depth) + ")" : variable();
     const std::string node = _random.oneOf({".", ".", "./b", variable()});
-    switch (_random.below(4)) {
+    switch (_random.below(5)) {
+      case 4:
+        return nearbyNode();
       case 0:
         return "exists(" + node + _random.oneOf({" intersect ", " except "}) + set + ")";
       case 1:
@@ -147,6 +149,16 @@ class ProgramGenerator {
         return "(some $w in " + set + " satisfies " +
                (_random.below(2) ? "$w is " + node : node + " is $w") + ")";
     }
+  }
+
+  // One node and a few steps.
+  std::string nearbyNode() {
+    const std::string found =
+        _random.oneOf({"ancestor::a", "ancestor-or-self::b", "ancestor::node()", "../b", "a", "@x",
+                       "b/text()", variable() + "/c", variable() + "/ancestor::a"});
+    const std::string both =
+        _random.below(2) ? found + " intersect " + variable() : variable() + " intersect " + found;
+    return _random.oneOf({"", "not", "exists", "c and ", "not(@x) or "}) + "(" + both + ")";
   }
 
   // What only asks whether there are nodes, or how many.

@@ -515,6 +515,46 @@ TEST(TakePositions, AsksNothingWithoutNodes) {
   resultOf(text, manyNames());
 }
 
+// --- nearby nodes --------------------------------------------------------------------------------
+
+TEST(FindNearbyNodes, TakesOverWhereAShortPathMeetsAVariable) {
+  for (const char* condition :
+       {"ancestor::a intersect $a", "$a intersect ancestor::a", "exists(b/text() intersect $a)",
+        "not(ancestor-or-self::c intersect ($a))", "../b intersect $a", "@y and (.. intersect $a)",
+        "empty($a/b intersect $a)", "ancestor::node() intersect $a"}) {
+    const std::string text = std::string("for $a in //a return //b[") + condition + "]";
+    EXPECT_EQ(operatorsOf("nearby nodes", text), 1U) << text;
+    for (const char* items : {"//a", "(//a, //b, //c)", "(/, //@y, //text())", "(//a, 1)", "()"}) {
+      const std::string other =
+          std::string("for $a in ") + items + " return //*[" + condition + "]";
+      resultOf(other, names());
+      resultOf("let $a := " + std::string(items) + " return //*[" + condition + "]", manyNames());
+    }
+  }
+}
+
+TEST(FindNearbyNodes, AnswersTheNode) {
+  for (const char* text : {"for $a in //a return //b/(ancestor::a intersect $a)",
+                           "for $a in //a, $b in //b return count($b/ancestor::a intersect $a)",
+                           "let $a := <a><b/></a> return $a/b/(.. intersect $a)",
+                           "for $a in //a return (1, 2)/(ancestor::a intersect $a)",
+                           "for $a in //a return ('x')[ancestor::a intersect $a]"}) {
+    resultOf(text, names());
+    resultOf(text, manyNames());
+  }
+}
+
+TEST(FindNearbyNodes, LeavesOthersAlone) {
+  for (const char* text : {"for $a in //a return //b[ancestor::a except $a]",
+                           "for $a in //a return //b[. intersect $a]",
+                           "for $a in //a return //b[following::a intersect $a]",
+                           "for $a in //a return //b[ancestor::a[1] intersect $a]",
+                           "declare variable $a := //a; //b[ancestor::a intersect $a]"}) {
+    EXPECT_EQ(operatorsOf("nearby nodes", text), 0U) << text;
+    resultOf(text, names());
+  }
+}
+
 // --- members -------------------------------------------------------------------------------------
 
 TEST(AskMembers, TakesOverWhereOneNodeMeetsASet) {
