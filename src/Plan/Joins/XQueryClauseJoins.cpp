@@ -101,16 +101,49 @@ bool XQueryClauseJoins::readsOnly(XQueryPlaceID place, int64_t varID) const {
 void XQueryClauseJoins::addTermsAhead(size_t index, const XQueryJoinScope& scope,
                                       const XQueryJoinSearch& search,
                                       XQueryJoinCondition& condition) const {
+  const std::vector<XQueryPlaceID> all = search.conjuncts(_condition);
   std::vector<XQueryPlaceID> conditions;
-  for (const XQueryPlaceID each : search.conjuncts(_condition)) {
+  for (const XQueryPlaceID each : all) {
     if (!search.cannotFail(each) || !facts(each).isRepeatable()) break;
     conditions.push_back(each);
   }
-  for (size_t later = index + 1; later < _clauses.size() && conditions.size() > 1; ++later) {
-    if (!walksItems(later) || clauseAt(later).kind() != Kind::ForExpr) continue;
+  const int64_t varID = clauseAt(index).varID();
+  for (size_t later = index + 1; later < _clauses.size() && all.size() > 1; ++later) {
+    if (clauseAt(later).kind() != Kind::ForExpr || boundAt(later) == XQueryNoPlace) continue;
     if (scope.readsOf(facts(boundAt(later))) != XQueryJoinReads::Round) continue;
-    addTermsAhead(later, conditions, clauseAt(index).varID(), scope, condition);
+    if (walksItems(later)) addTermsAhead(later, conditions, varID, scope, condition);
+    const bool isLeftAlone = condition.terms.empty() && mayLookAhead(later, all, varID, scope);
+    if (isLeftAlone) _planning.refuse(_clauses[index], obstacleAhead(later));
   }
+}
+
+// Of a later clause that picks items of an earlier one.
+std::string_view XQueryClauseJoins::obstacleAhead(size_t later) const {
+  if (walksItems(later)) {
+    return "of the conditions on a later clause, which would be asked sooner, one may fail";
+  }
+  return "the later clause that it is compared with declares a type, or walks a range";
+}
+
+// Whether a condition compares the variable with that of a later clause, and another one that with
+// what is known sooner.
+bool XQueryClauseJoins::mayLookAhead(size_t later, const std::vector<XQueryPlaceID>& conditions,
+                                     int64_t varID, const XQueryJoinScope& scope) const {
+  const int64_t laterID = clauseAt(later).varID();
+  bool picksLater = false;
+  bool picksItem = false;
+  for (const XQueryPlaceID each : conditions) {
+    const Sides sides = sidesOf(each);
+    if (sides.first == XQueryNoPlace) continue;
+    for (const auto [key, probe] :
+         {std::pair(sides.first, sides.second), std::pair(sides.second, sides.first)}) {
+      const bool isKnownSooner =
+          !facts(probe).reads.isEmpty() && scope.readsOf(facts(probe)) == XQueryJoinReads::Round;
+      picksLater = picksLater || (readsOnly(key, laterID) && isKnownSooner);
+      picksItem = picksItem || (readsOnly(key, varID) && readsOnly(probe, laterID));
+    }
+  }
+  return picksLater && picksItem;
 }
 
 // Those of one later clause, for the items of the variable.
@@ -165,13 +198,30 @@ void XQueryClauseJoins::addTermsAhead(size_t later, const std::vector<XQueryPlac
   }
 }
 
-bool XQueryClauseJoins::joinClause(size_t index) {
-  if (!walksItems(index)) return false;
+XQueryJoinScope XQueryClauseJoins::scopeOf(size_t index) const {
   const XQueryBindingExpr& clause = clauseAt(index);
   XQueryJoinScope scope;
   scope.item.add(clause.varID());
   scope.settled.add(clause.varID());
   scope.settled.add(positionOf(clause));
+  return scope;
+}
+
+bool XQueryClauseJoins::seesComparison() const {
+  for (size_t index = 0; index < _clauses.size(); ++index) {
+    if (!walksItems(index)) continue;
+    XQueryJoinScope scope = scopeOf(index);
+    Later later = clausesBehind(index, scope);
+    const XQueryJoinSearch search(_planning, scope, std::move(later.following));
+    if (!search.conditionIn(_condition, false).terms.empty()) return true;
+  }
+  return false;
+}
+
+bool XQueryClauseJoins::joinClause(size_t index) {
+  if (!walksItems(index)) return false;
+  const XQueryBindingExpr& clause = clauseAt(index);
+  XQueryJoinScope scope = scopeOf(index);
   Later later = clausesBehind(index, scope);
   const XQueryJoinSearch search(_planning, scope, std::move(later.following));
   XQueryJoinCondition condition = _picks == Picks::WhereItHolds

@@ -32,6 +32,8 @@ class XQueryClauseJoins {
     for (size_t index = 0; index < _clauses.size(); ++index) areAny = joinClause(index) || areAny;
     return areAny;
   }
+  // Whether there are comparisons that could pick items of one of them.
+  bool seesComparison() const;
 
  private:
   static std::vector<XQueryPlaceID> partsBefore(XQueryPlaceID end, XQueryPlaceID whole,
@@ -60,6 +62,7 @@ class XQueryClauseJoins {
     std::string_view obstacle;    // why no item can be left out
   };
 
+  XQueryJoinScope scopeOf(size_t index) const;
   Later clausesBehind(size_t index, XQueryJoinScope& scope) const;
   // The operands of an equality.
   struct Sides {
@@ -72,6 +75,9 @@ class XQueryClauseJoins {
                      XQueryJoinCondition& condition) const;
   void addTermsAhead(size_t later, const std::vector<XQueryPlaceID>& conditions, int64_t varID,
                      const XQueryJoinScope& scope, XQueryJoinCondition& condition) const;
+  bool mayLookAhead(size_t later, const std::vector<XQueryPlaceID>& conditions, int64_t varID,
+                    const XQueryJoinScope& scope) const;
+  std::string_view obstacleAhead(size_t later) const;
   bool walksItems(size_t index) const;
   bool mayFollow(size_t index, size_t later) const;
   bool joinClause(size_t index);

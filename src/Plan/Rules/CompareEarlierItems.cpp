@@ -4,6 +4,8 @@
 //             steps to children and attributes behind the predicate, where V is a variable
 // Facts       L and E are repeatable; E cannot fail and does not read the focus; L cannot fail
 //             unless it is on the left, where it is evaluated first
+// Refused     where one of these is missing; for items that are not those of a variable; for steps
+//             of another kind
 // Operator    XQueryEarlierItems: finds the first item that is equal in a table of all of them
 // Why         see there
 #include "Expr/Operators/XQueryOperatorExpr.h"
@@ -15,6 +17,8 @@
 #include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/PositionConditions.h"
 
+#include <optional>
+#include <string_view>
 #include <utility>
 
 namespace xquery {
@@ -25,9 +29,13 @@ bool canRepeat(const XQueryFacts& facts) {
          !facts.does(XQueryDeeds::LoadsDocuments);
 }
 
-bool isIdle(const XQueryFacts& facts) {
-  return canRepeat(facts) && !facts.does(XQueryDeeds::MayFail);
-}
+// The items before a position.
+struct Earlier {
+  const XQueryStep* step;  // with the predicate
+  XQueryPlaceID source;
+  XQueryPlaceID bound;
+  bool isInclusive;
+};
 
 class Search {
  public:
@@ -41,53 +49,83 @@ class Search {
       const XQueryPlaceID left = _program.firstPart(place);
       const XQueryPlaceID right = left == XQueryNoPlace ? left : _program.nextPart(left);
       if (right == XQueryNoPlace || XQueryOperatorExpr::rangeIn(comparison->right())) continue;
-      if (canRepeat(_planning.facts[left]) && takeOver(place, left, right)) continue;
-      if (isIdle(_planning.facts[right])) takeOver(place, right, left);
+      lookAt(place, left, right);
     }
   }
 
  private:
-  bool takeOver(XQueryPlaceID place, XQueryPlaceID value, XQueryPlaceID items) {
-    const XQueryPlaceID pathPlace = XQueryPlaceInside(_program, items);
-    const auto* path = dyn_cast<XQueryPathExpr>(_program[pathPlace].expr);
-    const XQueryStep* step = path ? path->step() : nullptr;
-    const bool fits = step && step->kind() == Kind::FilterStep && step->predicates().size() == 1 &&
-                      _program[value].slot;
-    if (!fits) return false;
-    const XQueryPlaceID source =
-        XQueryPlaceInside(_program, _program.part(pathPlace, XQueryRole::FirstStep));
-    const XQueryPlaceID predicate = _program.part(pathPlace, XQueryRole::Predicate);
-    if (source == XQueryNoPlace || predicate == XQueryNoPlace) return false;
-    if (!isa<XQueryVariable>(_program[source].expr) || _program[predicate].step != step) {
-      return false;
-    }
+  void lookAt(XQueryPlaceID place, XQueryPlaceID left, XQueryPlaceID right) {
+    std::string_view obstacle;
+    if (takeOver(place, left, right, true, obstacle)) return;
+    if (takeOver(place, right, left, false, obstacle)) return;
+    if (!obstacle.empty()) _planning.refuse(place, obstacle);
+  }
+
+  bool takeOver(XQueryPlaceID place, XQueryPlaceID value, XQueryPlaceID items, bool isValueFirst,
+                std::string_view& obstacle) {
+    const std::optional<Earlier> earlier = earlierIn(items);
+    if (!earlier || !_program[value].slot) return false;
     XQueryEarlierItems::Operands operands{};
+    obstacle = obstacleTo(*earlier, _planning.facts[value], isValueFirst);
+    if (obstacle.empty() && !operands.walk.readSteps(earlier->step->next())) {
+      obstacle = "the steps behind the position are not a few to children and attributes";
+    }
+    if (!obstacle.empty()) return false;
     operands.value = *_program[value].slot;
-    operands.items = Ref<XQueryExpr>(_program[source].expr);
-    if (!readBound(predicate, operands) || !operands.walk.readSteps(step->next())) return false;
+    operands.items = Ref<XQueryExpr>(_program[earlier->source].expr);
+    operands.bound = Ref<XQueryExpr>(_program[earlier->bound].expr);
+    operands.isInclusive = earlier->isInclusive;
     _planning.wrap(place,
                    XQueryEarlierItems::exprWithPlain(*_program[place].slot, std::move(operands)));
     return true;
   }
 
-  // "position() < E", "E >= position()".
-  bool readBound(XQueryPlaceID predicate, XQueryEarlierItems::Operands& operands) const {
+  // What stands in the way; empty for nothing.
+  std::string_view obstacleTo(const Earlier& earlier, const XQueryFacts& ofValue,
+                              bool isValueFirst) const {
+    const XQueryFacts& ofBound = _planning.facts[earlier.bound];
+    if (!isa<XQueryVariable>(_program[earlier.source].expr)) {
+      return "the items before the position are not those of a variable";
+    }
+    if (earlier.step->predicates().size() != 1) return "the items have another predicate";
+    if (!canRepeat(ofBound)) return "the position is compared with what cannot be repeated";
+    if (ofBound.does(XQueryDeeds::MayFail)) {
+      return "the position is compared with what may fail, once for each item";
+    }
+    if (ofBound.does(XQueryDeeds::ReadsFocus)) {
+      return "the position is compared with what reads the context item or its position";
+    }
+    if (!canRepeat(ofValue)) return "they are compared with what cannot be repeated";
+    if (!isValueFirst && ofValue.does(XQueryDeeds::MayFail)) {
+      return "they are compared with what may fail, after them";
+    }
+    return {};
+  }
+
+  // A filter of some items whose first predicate asks for a position below another one.
+  std::optional<Earlier> earlierIn(XQueryPlaceID items) const {
+    const XQueryPlaceID pathPlace = XQueryPlaceInside(_program, items);
+    const auto* path = dyn_cast<XQueryPathExpr>(_program[pathPlace].expr);
+    const XQueryStep* step = path ? path->step() : nullptr;
+    if (!step || step->kind() != Kind::FilterStep) return std::nullopt;
+    const XQueryPlaceID source =
+        XQueryPlaceInside(_program, _program.part(pathPlace, XQueryRole::FirstStep));
+    const XQueryPlaceID predicate = _program.part(pathPlace, XQueryRole::Predicate);
+    if (source == XQueryNoPlace || predicate == XQueryNoPlace) return std::nullopt;
+    if (_program[predicate].step != step) return std::nullopt;
     const XQueryPlaceID place = XQueryPlaceInside(_program, predicate);
     const auto* comparison = dyn_cast<XQueryOperatorExpr>(_program[place].expr);
-    if (!comparison) return false;
+    if (!comparison) return std::nullopt;
     const bool isOnLeft = XQueryIsPosition(comparison->left());
-    if (!isOnLeft && !XQueryIsPosition(comparison->right())) return false;
+    if (!isOnLeft && !XQueryIsPosition(comparison->right())) return std::nullopt;
     const int written = comparison->operatorType();
     const int type = isOnLeft ? written : XQueryMirroredComparison(written);
     const bool isBelow = type == XQueryOperatorLess || type == XQueryOperatorLt;
-    operands.isInclusive = type == XQueryOperatorLessEqual || type == XQueryOperatorLe;
+    const bool isInclusive = type == XQueryOperatorLessEqual || type == XQueryOperatorLe;
     const XQueryPlaceID first = _program.firstPart(place);
     const XQueryPlaceID bound = isOnLeft ? _program.nextPart(first) : first;
-    if ((!isBelow && !operands.isInclusive) || bound == XQueryNoPlace) return false;
-    const XQueryFacts& facts = _planning.facts[bound];
-    if (!isIdle(facts) || facts.does(XQueryDeeds::ReadsFocus)) return false;
-    operands.bound = Ref<XQueryExpr>(_program[bound].expr);
-    return true;
+    if ((!isBelow && !isInclusive) || bound == XQueryNoPlace) return std::nullopt;
+    return Earlier{step, source, bound, isInclusive};
   }
 
   XQueryPlanning& _planning;

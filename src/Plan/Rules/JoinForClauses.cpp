@@ -28,6 +28,7 @@
 #include "Plan/Rules/PositionConditions.h"
 
 #include <algorithm>
+#include <string_view>
 
 namespace xquery {
 namespace {
@@ -71,12 +72,24 @@ void describeYield(const XQueryPlanning& planning, XQueryPlaceID place, XQueryPl
   expr.setYieldOfPicks(yield);
 }
 
+// Why the zeros of a sum cannot be left out; empty for nothing.
+std::string_view obstacleToSum(const XQueryFLWORExpr& expr, const XQueryFacts& summed) {
+  const auto isFor = [](const auto& clause) { return clause->kind() == Kind::ForExpr; };
+  if (std::count_if(expr.forLet().begin(), expr.forLet().end(), isFor) != 1) {
+    return "it is not told how many zeros several for clauses sum up";
+  }
+  if (!summed.are(XQueryItems::Numeric | XQueryItems::Untyped | XQueryItems::Node)) {
+    return "what is summed up may be no number, and an error together with a zero";
+  }
+  return {};
+}
+
 // "return if (C) then T else ()", and "else 0" in a sum.
 void joinConditional(XQueryPlanning& planning, XQueryPlaceID place, XQueryFLWORExpr& expr) {
   const XQueryProgram& program = planning.program;
   const XQueryPlaceID part = program.part(place, XQueryRole::Return);
   const XQueryPlaceID conditional = XQueryPlaceInside(program, part);
-  if (conditional == XQueryNoPlace || !expr.orderSpecs().empty()) return;
+  if (conditional == XQueryNoPlace) return;
   if (program[conditional].expr->kind() != Kind::ConditionalExpr) return;
   const XQueryPlaceID test = program.part(conditional, XQueryRole::Test);
   if (test == XQueryNoPlace) return;
@@ -85,13 +98,23 @@ void joinConditional(XQueryPlanning& planning, XQueryPlaceID place, XQueryFLWORE
   if (other == XQueryNoPlace) return;
   const XQueryFacts& ofOther = planning.facts[other];
   const bool isNothing = ofOther.most == 0 && ofOther.deeds == 0 && ofOther.assigns.isEmpty();
-  const auto isFor = [](const auto& clause) { return clause->kind() == Kind::ForExpr; };
-  const bool isZero =
-      XQuerySmallIntegerIn(program[other].expr) == 0 && sumOf(program, place) == Sum::Plain &&
-      planning.facts[then].are(XQueryItems::Numeric | XQueryItems::Untyped | XQueryItems::Node) &&
-      std::count_if(expr.forLet().begin(), expr.forLet().end(), isFor) == 1;
-  if (!isNothing && !isZero) return;
-  if (!XQueryClauseJoins(planning, place, part, test, Picks::WhereItHolds).join()) return;
+  const bool isZero = !isNothing && XQuerySmallIntegerIn(program[other].expr) == 0 &&
+                      sumOf(program, place) == Sum::Plain;
+  XQueryClauseJoins joins(planning, place, part, test, Picks::WhereItHolds);
+  std::string_view obstacle;
+  if (!expr.orderSpecs().empty()) {
+    obstacle = "what is ordered by may fail for an item that would be left out";
+  } else if (isZero) {
+    obstacle = obstacleToSum(expr, planning.facts[then]);
+  } else if (!isNothing) {
+    obstacle =
+        "where the condition does not hold, the \"if\" answers something, and no zero of a sum";
+  }
+  if (!obstacle.empty()) {
+    if (joins.seesComparison()) planning.refuse(place, obstacle);
+    return;
+  }
+  if (!joins.join()) return;
   expr.setReturnOfPicks(planning.exprAt(then), isZero ? planning.exprAt(other) : nullptr);
   describeYield(planning, place, then, expr);
 }
