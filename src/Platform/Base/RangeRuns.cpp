@@ -65,9 +65,9 @@ void hideFromLeakChecker(const void*, size_t) {}
 size_t mostToReserve() {
   rlimit space;
   if (getrlimit(RLIMIT_AS, &space) != 0 || space.rlim_cur == RLIM_INFINITY) return SIZE_MAX;
-  constexpr size_t others = size_t{256} << 20;  // the program, its libraries, its stack
+  constexpr size_t others = size_t{128} << 20;  // the program, its libraries
   const size_t all = space.rlim_cur;
-  return std::max(all > others ? (all - others) / 2 : 0, all / 8);
+  return all > 2 * others ? (all - others) / 2 : all / 4;
 }
 
 char* reserved(size_t bytes) {
