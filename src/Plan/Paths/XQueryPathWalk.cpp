@@ -3,6 +3,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryPathResults.h"
+#include "Expr/XQueryLists.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Operators/XQueryNodeQuestion.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
@@ -22,13 +23,12 @@ bool descendantsAreSubtree(const NSXMLNode* node) {
   return XQueryDescendantStop(node) || !node->parent() || !node->parent()->parent();
 }
 
-// What the predicate is as a condition on a node; null where it has to be evaluated.
-const XQueryNodeQuestion* questionIn(const XQueryExpr* predicate) {
-  const auto* planned = dyn_cast<XQueryPlannedExpr>(predicate);
+}  // namespace
+
+const XQueryNodeQuestion* XQueryNodeQuestionIn(const XQueryExpr* predicate) {
+  const auto* planned = dyn_cast<XQueryPlannedExpr>(XQueryWithoutParentheses(predicate));
   return planned ? planned->nodeQuestion() : nullptr;
 }
-
-}  // namespace
 
 XQueryAxisTrail& XQueryPathWalk::trail(size_t index) {
   if (_trails.empty()) _trails.resize(_trailCount);
@@ -202,7 +202,7 @@ bool XQueryPathWalk::keepsAlone(const XQueryWalkedStep& step, size_t firstPredic
   const auto& predicates = step.step->predicates();
   for (auto each = predicates.begin() + static_cast<std::ptrdiff_t>(firstPredicate);
        each != predicates.end(); ++each) {
-    const XQueryNodeQuestion* question = questionIn(each->get());
+    const XQueryNodeQuestion* question = XQueryNodeQuestionIn(each->get());
     const auto answer = question ? question->holdsFor(node, context) : std::nullopt;
     if (answer.value_or(false)) continue;
     if (answer) return false;
@@ -219,7 +219,7 @@ bool XQueryPathWalk::filterNodes(const XQueryWalkedStep& step, size_t fromIndex,
   const auto& predicates = step.step->predicates();
   for (size_t index = fromIndex; index < predicates.size(); ++index) {
     const XQueryNodeQuestion* question =
-        step.step->asksForPosition(index) ? nullptr : questionIn(predicates[index].get());
+        step.step->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicates[index].get());
     if (!question) return step.step->filterNodes(nodes, index, context);
     if (!keepNodes(*predicates[index], *question, nodes)) return false;
   }

@@ -47,6 +47,9 @@ namespace xquery {
 
 class XQueryNodeQuestion;
 
+// What a predicate is as a condition on a node; null where it has to be evaluated.
+const XQueryNodeQuestion* XQueryNodeQuestionIn(const XQueryExpr* predicate);
+
 class XQueryPathWalk : public XQueryPathRun {
  public:
   // `trailCount` of the steps keep trails.

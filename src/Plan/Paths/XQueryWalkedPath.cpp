@@ -4,6 +4,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryPathResults.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Operators/XQueryNodeQuestion.h"
 #include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
@@ -18,6 +19,29 @@ bool isKeptByAll(const XQueryStep& step, size_t firstPredicate, NSObject* item, 
                      predicates.end(), [&](const auto& predicate) {
                        return XQueryStep::keeps(*predicate, item, position, context);
                      });
+}
+
+// As a step filters its items, which asks all of them by evaluating the predicate.
+Value keptItems(const Value& items, const XQueryExpr& predicate, const XQueryNodeQuestion& question,
+                XQueryContext& context) {
+  auto& dynamic = context._internal();
+  const XQueryItemList list(items.get());
+  dynamic.setLast(static_cast<int64_t>(list.count()));
+  XQueryGatherer kept;
+  WorkPacer pacer;
+  for (size_t i = 0; i < list.count(); ++i) {
+    pacer.turn();
+    auto* node = dyn_cast<NSXMLNode>(list[i]);
+    const auto answer = node ? question.holdsFor(node, context) : std::nullopt;
+    const auto position = static_cast<int64_t>(i) + 1;
+    if (answer ? *answer : XQueryStep::keeps(predicate, list[i], position, context)) {
+      kept.add(list[i]);
+    } else if (!answer && dynamic.isFailing()) {
+      return {};
+    }
+    if (answer && i + 1 == list.count()) dynamic.setContextItem(node, position);
+  }
+  return kept.value();
 }
 
 }  // namespace
@@ -160,7 +184,16 @@ Value XQueryWalkedPath::evaluateStart(XQueryContext& context,
       _start->expr() ? _start->expr()->evaluateWithContext(context) : Value(NSNull::null());
   if (XQueryHasFailed(items, context)) return {};
   if (_picker && _pickedStep == _start && pickItems(items, context, number)) return items;
-  return _start->handlePreicatesFromIndex(0, std::move(items), context);
+  size_t index = 0;
+  for (const auto& predicate : _start->predicates()) {
+    const auto* question =
+        _start->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicate.get());
+    if (!question) break;
+    items = keptItems(items, *predicate, *question, context);
+    if (XQueryHasFailed(items, context)) return {};
+    ++index;
+  }
+  return _start->handlePreicatesFromIndex(index, std::move(items), context);
 }
 
 // --- picking -------------------------------------------------------------------------------------
