@@ -135,7 +135,7 @@ bool XQueryClauseJoins::mayLookAhead(size_t later, const std::vector<XQueryPlace
   for (const XQueryPlaceID each : conditions) {
     const Sides sides = sidesOf(each);
     if (sides.first == XQueryNoPlace) continue;
-    for (const auto [key, probe] :
+    for (const auto& [key, probe] :
          {std::pair(sides.first, sides.second), std::pair(sides.second, sides.first)}) {
       const bool isKnownSooner =
           !facts(probe).reads.isEmpty() && scope.readsOf(facts(probe)) == XQueryJoinReads::Round;

@@ -75,10 +75,10 @@ class XQueryJoin::Tables final : public XQueryKeptValue {
   bool holdsEachNodeOnce() {
     if (!_isAscending) {
       WorkPacer pacer;
-      const auto breaksOrder = [&pacer](const Value& one, const Value& next) {
+      const auto breaksOrder = [&pacer](const Value& one, const Value& other) {
         pacer.turn();
         const auto* a = cast<NSXMLNode>(one.get());
-        const auto* b = cast<NSXMLNode>(next.get());
+        const auto* b = cast<NSXMLNode>(other.get());
         return !NSXMLNode::haveComparableOrder(a, b) || a->orderNumber() >= b->orderNumber();
       };
       _isAscending = std::adjacent_find(items->begin(), items->end(), breaksOrder) == items->end();
