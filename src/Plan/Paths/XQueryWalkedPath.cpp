@@ -186,6 +186,7 @@ Value XQueryWalkedPath::evaluateStart(XQueryContext& context,
   if (_picker && _pickedStep == _start && pickItems(items, context, number)) return items;
   size_t index = 0;
   for (const auto& predicate : _start->predicates()) {
+    if (!items) break;  // there is no context item
     const auto* question =
         _start->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicate.get());
     if (!question) break;
