@@ -111,8 +111,8 @@ TEST(XMLRoom, AttributesFollowEachOther) {
   const auto a = NSXMLElement::elementWithName(NSStringView::ascii("a"));
   NSXMLNode* last = nullptr;
   for (const char* name : {"b", "c", "d"}) {
-    NSXMLNode* attribute = NSXMLTree::makeLoneAttribute(
-        NSXMLInternName(NSStringView::ascii(name), {}), NSStringView::ascii("1"));
+    NSXMLNode* attribute = NSXMLTree::makeLoneNode(Kind::Attribute, NSStringView::ascii("1"),
+                                                   NSXMLInternName(NSStringView::ascii(name), {}));
     NSXMLTree::appendProperty(a.get(), attribute, last);
     last = attribute;
     a->addNamespace(
