@@ -177,9 +177,9 @@ TEST(XMLParser, AFileIsReadInPieces) {
 }
 
 TEST(XMLParser, AHostIsToldHowMuchOfAFileHasBeenRead) {
-  // The second text is left to libxml2, which begins again.
-  for (const std::string_view declaration : {"", "<!DOCTYPE a [<!ENTITY e 'x'>]>"}) {
-    const std::string text = std::string(declaration) + "<a>" + std::string(2000000, 'x') + "</a>";
+  // The second text is left to libxml2 at its end, which begins again.
+  for (const std::string_view end : {"", "<b xmlns:xml='http://www.w3.org/XML/1998/namespace'/>"}) {
+    const std::string text = "<a>" + std::string(2000000, 'x') + std::string(end) + "</a>";
     const TestFolder folder;
     folder.write("a.xml", text);
     uint64_t last = 0;
@@ -195,7 +195,7 @@ TEST(XMLParser, AHostIsToldHowMuchOfAFileHasBeenRead) {
     ASSERT_TRUE(document);
     EXPECT_EQ(last, text.size());
     EXPECT_GE(pieces, 4);
-    EXPECT_EQ(beginnings, declaration.empty() ? 1 : 2);
+    EXPECT_EQ(beginnings, end.empty() ? 1 : 2);
   }
 }
 
