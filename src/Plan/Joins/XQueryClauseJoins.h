@@ -22,7 +22,7 @@ class XQueryClauseJoins {
   XQueryClauseJoins(XQueryPlanning& planning, XQueryPlaceID expr, XQueryPlaceID part,
                     XQueryPlaceID condition, Picks picks)
       : _planning(planning),
-        _clauses(partsBefore(part, expr, planning.program)),
+        _clauses(clausesBefore(part, expr, planning.program)),
         _condition(condition),
         _picks(picks) {}
 
@@ -36,14 +36,15 @@ class XQueryClauseJoins {
   bool seesComparison() const;
 
  private:
-  static std::vector<XQueryPlaceID> partsBefore(XQueryPlaceID end, XQueryPlaceID whole,
-                                                const XQueryProgram& program) {
-    std::vector<XQueryPlaceID> parts;
-    for (XQueryPlaceID part = program.firstPart(whole); part != end;
-         part = program.nextPart(part)) {
-      parts.push_back(part);
+  // What is ordered by stands behind them.
+  static std::vector<XQueryPlaceID> clausesBefore(XQueryPlaceID end, XQueryPlaceID whole,
+                                                  const XQueryProgram& program) {
+    std::vector<XQueryPlaceID> clauses;
+    for (XQueryPlaceID part = program.firstPart(whole);
+         part != end && isa<XQueryBindingExpr>(program[part].expr); part = program.nextPart(part)) {
+      clauses.push_back(part);
     }
-    return parts;
+    return clauses;
   }
 
   const XQueryPlace& at(XQueryPlaceID place) const { return _planning.program[place]; }
