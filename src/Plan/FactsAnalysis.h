@@ -109,6 +109,8 @@ void XQueryFactsOfCall(const XQueryFactsAt& at, XQueryFacts& facts);
 
 // What a value is known to be that matches a declared type: a matter of kinds and count.
 void XQueryRestrictToType(const XQueryExpr* type, XQueryFacts& facts);
+// Whether an operator may fail where its operands do not.
+bool XQueryOperatorMayFail(int type, const XQueryFacts& left, const XQueryFacts& right);
 // The kinds that an axis step may find.
 class XQueryAxisStep;
 XQueryItemKinds XQueryKindsOfStep(const XQueryAxisStep& step);

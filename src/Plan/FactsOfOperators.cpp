@@ -51,22 +51,38 @@ void concludeSet(const Operands& operands, int type, XQueryFacts& facts) {
   facts.setItems(nodes);
 }
 
-// Nodes and untyped values are compared by their text, and any two numbers can be compared.
-bool canBeCompared(const Operands& operands) {
-  const auto are = [&](XQueryItemKinds kinds) {
-    return operands.left.are(kinds) && operands.right.are(kinds);
+// Any two numbers can be compared, and so can any two texts, but that a general comparison casts
+// what is untyped to the type of the other side: not every text is a token, say.
+bool canBeCompared(const XQueryFacts& left, const XQueryFacts& right, bool isGeneral) {
+  const auto are = [&](XQueryItemKinds kinds) { return left.are(kinds) && right.are(kinds); };
+  if (are(Numeric)) return true;
+  if (!are(Node | Untyped | String)) return false;
+  const auto castsText = [](const XQueryFacts& text, const XQueryFacts& other) {
+    return text.mayBe(Node | Untyped) && other.mayBe(DerivedString);
   };
-  return are(Node | Untyped) || are(Numeric);
+  return !isGeneral || !(castsText(left, right) || castsText(right, left));
 }
 
 }  // namespace
+
+bool XQueryOperatorMayFail(int type, const XQueryFacts& left, const XQueryFacts& right) {
+  switch (XQueryOperatorExpr::operatorClassification(type)) {
+    case 1:  // logical: an error record takes the place of an answer
+      return left.mayBe(Other) || right.mayBe(Other);
+    case 5:  // value comparison
+      return left.most > 1 || right.most > 1 || !canBeCompared(left, right, false);
+    case 6:  // general comparison
+      return !canBeCompared(left, right, true);
+    default:
+      return true;
+  }
+}
 
 void XQueryFactsOfOperator(const XQueryFactsAt& at, XQueryFacts& facts) {
   const auto& expr = at.expr<XQueryOperatorExpr>();
   const Operands operands = operandsOf(at);
   const int operatorClass = XQueryOperatorExpr::operatorClassification(expr.operatorType());
-  constexpr int generalComparison = 6;
-  if (operatorClass != generalComparison || !canBeCompared(operands)) {
+  if (XQueryOperatorMayFail(expr.operatorType(), operands.left, operands.right)) {
     facts.deeds |= XQueryDeeds::MayFail;
   }
   switch (operatorClass) {

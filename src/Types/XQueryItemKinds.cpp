@@ -10,7 +10,7 @@ XQueryItemKinds kindsOfPrimitive(XQueryTypeID primitive) {
     case XQueryTypeUntypedAtomic:
       return Untyped;
     case XQueryTypeString:
-      return String;
+      return DerivedString;
     case XQueryTypeBoolean:
       return Boolean;
     case XQueryTypeDouble:
@@ -50,6 +50,7 @@ XQueryItemKinds kindsOfPrimitive(XQueryTypeID primitive) {
 
 // Of values that have exactly the type.
 XQueryItemKinds kindsOfExactly(XQueryTypeID type) {
+  if (type == XQueryTypeString) return PlainString;
   if (type == XQueryTypeYearMonthDuration) return YearMonthDuration;
   if (type == XQueryTypeDayTimeDuration) return DayTimeDuration;
   if (XQueryIsKindOfType(type, XQueryTypeInteger)) return Integer;

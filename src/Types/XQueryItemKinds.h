@@ -2,8 +2,8 @@
 //
 //   bits 0 to 6    the seven kinds of nodes
 //   from bit 7 on  the families of atomic values: a primitive type with all that derives from it,
-//                  where decimals without the integers, and each of the three durations, are
-//                  families of their own
+//                  where strings as such, decimals without the integers, and each of the three
+//                  durations, are families of their own
 //   the last bit   what is no item by its type: error records, raw data, arrays of a host that
 //                  stand inside an array
 #pragma once
@@ -30,7 +30,7 @@ inline constexpr XQueryItemKinds Text = 1U << 6;
 inline constexpr XQueryItemKinds Node = (1U << 7) - 1;
 
 inline constexpr XQueryItemKinds Untyped = 1U << 7;
-inline constexpr XQueryItemKinds String = 1U << 8;
+inline constexpr XQueryItemKinds PlainString = 1U << 8;  // exactly a string
 inline constexpr XQueryItemKinds Boolean = 1U << 9;
 inline constexpr XQueryItemKinds Integer = 1U << 10;
 inline constexpr XQueryItemKinds Decimal = 1U << 11;
@@ -48,8 +48,10 @@ inline constexpr XQueryItemKinds DayTimeDuration = 1U << 22;
 inline constexpr XQueryItemKinds HexBinary = 1U << 23;
 inline constexpr XQueryItemKinds Base64Binary = 1U << 24;
 inline constexpr XQueryItemKinds Notation = 1U << 25;
-inline constexpr XQueryItemKinds Other = 1U << 26;
+inline constexpr XQueryItemKinds DerivedString = 1U << 26;  // a token and its kin
+inline constexpr XQueryItemKinds Other = 1U << 27;
 
+inline constexpr XQueryItemKinds String = PlainString | DerivedString;
 inline constexpr XQueryItemKinds AnyDecimal = Integer | Decimal;
 inline constexpr XQueryItemKinds Numeric = AnyDecimal | Float | Double;
 inline constexpr XQueryItemKinds OrderedDuration = YearMonthDuration | DayTimeDuration;

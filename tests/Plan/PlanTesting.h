@@ -49,11 +49,11 @@ std::string bitNames(uint32_t bits, const Names& names) {
 }
 
 inline std::string kindNames(XQueryItemKinds kinds) {
-  static constexpr std::array<const char*, 27> names = {
+  static constexpr std::array<const char*, 28> names = {
       "document",  "element", "attribute", "namespace", "instruction", "comment",   "text",
       "untyped",   "string",  "boolean",   "integer",   "decimal",     "float",     "double",
       "URI",       "QName",   "dateTime",  "date",      "time",        "gregorian", "duration",
-      "yearMonth", "dayTime", "hex",       "base64",    "notation",    "other"};
+      "yearMonth", "dayTime", "hex",       "base64",    "notation",    "derived",   "other"};
   if (kinds == XQueryItems::Any) return "item";
   if (kinds == XQueryItems::Node) return "node";
   if (kinds == XQueryItems::Numeric) return "number";

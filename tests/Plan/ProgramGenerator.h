@@ -228,7 +228,8 @@ class ProgramGenerator {
       case 4:
         return variable();
       case 5:
-        return "xs:integer(" + _random.oneOf({"'1'", "'u'", "2"}) + ")";
+        return _random.oneOf({"xs:integer(", "xs:integer(", "xs:token(", "xs:NCName("}) +
+               _random.oneOf({"'1'", "'u'", "2"}) + ")";
       default:
         return path(depth - 1);
     }
@@ -526,7 +527,13 @@ class ProgramGenerator {
              _random.oneOf({"$u", "($u/@x, $u)", "<b>{$u/@x}</b>", "string($u)", expr(depth - 1)});
     });
     const std::string unsorted = within("$u", [&] {
-      return "for $u in " + many() + " where " + match("$u") + " return " +
+      const std::string condition =
+          _random.below(3) ? match("$u")
+                           : _random.oneOf({"$u/@x", "$u", "$u/@y", "name($u)"}) +
+                                 _random.oneOf({" = ", " eq ", " < "}) +
+                                 _random.oneOf({"'u'", "'a'", "xs:token('u')", "string($o)"}) +
+                                 _random.oneOf({"", " and $u/@y", " or $u/@y = '1'"});
+      return "for $u in " + many() + " where " + condition + " return " +
              _random.oneOf({"$u", "($u/@x, $u)", "string($u)"});
     });
     const std::string list = _random.oneOf({sorted, sorted, unsorted, path(depth - 1)});

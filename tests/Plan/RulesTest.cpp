@@ -390,7 +390,8 @@ TEST(TakeFirst, EndsWithTheTuplesThatAreAskedFor) {
   for (const char* text :
        {"(for $a in //a where $a/c return $a/b)[1]",
         "subsequence(for $a in //a, $b in $a/b return ($b, $a), 2, 3)",
-        "let $l := for $a in //a return ($a/@x, $a) return ($l[1], $l[position() < 3])"}) {
+        "let $l := for $a in //a return ($a/@x, $a) return ($l[1], $l[position() < 3])",
+        "(for $a in //a where $a/@x = ('1', '3') and $a/@x ne 'u' return $a/b)[1]"}) {
     EXPECT_EQ(operatorsOf("first", text), 1U) << text;
     EXPECT_LT(stepsOf(text), 100) << text;
     resultOf(text, manyNames());
@@ -399,6 +400,8 @@ TEST(TakeFirst, EndsWithTheTuplesThatAreAskedFor) {
   for (const char* text :
        {"(for $a in //a return xs:integer($a/@x))[1]", "(for $a in //a return <n/>)[1]",
         "(for $a in //a return trace($a, 't'))[1]", "(for $a in //a return $a)[last()]",
+        "(for $a in //a where $a/@x = 1 return $a)[1]",
+        "let $t := xs:token('1') return (for $a in //a where $a/@x = $t return $a)[1]",
         "((for $a in //a return $a)[1], some $y in //none satisfies $y, $y)"}) {
     EXPECT_EQ(operatorsOf("first", text), 0U) << text;
     resultOf(text, names());

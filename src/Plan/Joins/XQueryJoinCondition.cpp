@@ -370,13 +370,7 @@ bool XQueryJoinSearch::passComparison(XQueryPlaceID place, const XQueryJoinScope
   const XQueryPlaceID left = _planning.program.firstPart(place);
   const XQueryPlaceID right = _planning.program.nextPart(left);
   if (right == XQueryNoPlace || XQueryOperatorExpr::rangeIn(comparison->right())) return false;
-  constexpr XQueryItemKinds texts = XQueryItems::Node | XQueryItems::Untyped;
-  const auto are = [&](XQueryItemKinds kinds) {
-    return facts(left).are(kinds) && facts(right).are(kinds);
-  };
-  const bool isValueComparison = comparison->operatorType() >= XQueryOperatorEq;
-  if (isValueComparison && (facts(left).most > 1 || facts(right).most > 1)) return false;
-  if (!are(texts) && !are(XQueryItems::Numeric)) return false;
+  if (XQueryOperatorMayFail(comparison->operatorType(), facts(left), facts(right))) return false;
   XQueryJoinCondition& others = before.others;
   for (const XQueryPlaceID operand : {left, right}) {
     const XQueryJoinReads reads = scope.readsOf(facts(operand));

@@ -48,7 +48,7 @@ std::vector<Ref<NSString>> stringsIn(const XQueryExpr* expr) {
   const auto stringIn = [](const XQueryExpr* each) -> NSString* {
     const auto* literal = dyn_cast<XQueryLiteral>(XQueryWithoutParentheses(each));
     if (!literal || !literal->literalValue()) return nullptr;
-    const bool isString = XQueryKindsOfItem(*literal->literalValue()) == XQueryItems::String;
+    const bool isString = XQueryKindsOfItem(*literal->literalValue()) == XQueryItems::PlainString;
     return isString ? dyn_cast<NSString>(literal->literalValue().get()) : nullptr;
   };
   if (NSString* text = stringIn(expr)) return {Ref<NSString>(text)};
