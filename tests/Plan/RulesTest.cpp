@@ -20,10 +20,9 @@ using namespace plantest;
 
 // Of the rules that have no tests of their own.
 size_t operatorsIn(std::string_view text) {
-  static const std::set<std::string_view> others = {"texts",    "short paths",  "constants",
-                                                    "counts",   "sets",         "walks",
-                                                     "operands", "constructors", "lists",
-                                                     "nearby nodes"};
+  static const std::set<std::string_view> others = {
+      "texts", "short paths", "constants",    "counts", "sets",
+      "walks", "operands",    "constructors", "lists",  "nearby nodes"};
   return choicesIn(text, [](std::string_view rule) {
     return !others.contains(rule) && !rule.ends_with("-joins");
   });

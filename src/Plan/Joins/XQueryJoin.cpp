@@ -248,7 +248,8 @@ bool XQueryJoin::askEach(const Tables& tables, bool withProbes, XQueryContext& c
       continue;
     }
     static const Value nothing = NSNull::null();
-    Value probe = withProbes || term.mustNotFail ? XQueryValueOrNull(*term.probe, context) : nothing;
+    Value probe =
+        withProbes || term.mustNotFail ? XQueryValueOrNull(*term.probe, context) : nothing;
     if (!probe && term.mustNotFail) return false;
     auto question = table ? table->questionOf(withProbes ? probe : nothing) : std::nullopt;
     const bool answers = question && table->isRegularFor(*question);
