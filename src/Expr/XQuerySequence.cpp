@@ -3,6 +3,7 @@
 #include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -42,23 +43,10 @@ void XQuerySequence::addObject(const Value& item) {
 }
 
 void XQuerySequence::addObject(Value&& item) {
-  Value taken = std::move(item);
-  if (!taken || isNull(taken)) return;
-  auto* array = dyn_cast<NSArray>(taken.get());
-  if (!array) {
-    _objects.push_back(std::move(taken));
-  } else if (!array->hasOneReference()) {
-    addObject(taken);
+  if (item && !isNull(item) && !isa<NSArray>(item)) {
+    _objects.push_back(std::move(item));
   } else {
-    WorkPacer pacer;
-    for (Value& each : array->objects()) {
-      pacer.turn();
-      if (isa<NSArray>(each)) {
-        addObject(each);
-      } else if (each && !isNull(each)) {
-        _objects.push_back(std::move(each));
-      }
-    }
+    addObject(std::as_const(item));
   }
 }
 

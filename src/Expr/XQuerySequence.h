@@ -19,7 +19,7 @@ class XQuerySequence : public NSArray {
   [[nodiscard]] static Ref<XQuerySequence> sequenceWithItem(Value item);
 
   void addObject(const Value& item);
-  // Takes over the item, or those of an array that nobody else holds.
+  // Takes over an item that is no array.
   void addObject(Value&& item);
   // Ignores null and NSNull and does not flatten; into an empty sequence the index is not looked
   // at, past the end it appends.
