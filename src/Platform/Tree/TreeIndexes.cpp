@@ -212,7 +212,7 @@ NSXMLIndexedValues NSXMLIndexedValues::of(const NSXMLValueKey& key, const NSXMLN
 }
 
 void NSXMLNoteAskedValues(const NSXMLValueKey& key, uint64_t elements, const NSXMLNode* node) {
-  constexpr uint64_t nodesPerElement = 16;
+  constexpr uint64_t nodesPerElement = 48;
   if (NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(node)) {
     indexes->addWork(key, elements * nodesPerElement);
   }
