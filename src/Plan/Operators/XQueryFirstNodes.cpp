@@ -10,4 +10,9 @@ Value XQueryFirstNodes::computeValue(XQueryContext& context) const {
   return _path->firstItems(_most, context);
 }
 
+Value XQueryFirstTuples::computeValue(XQueryContext& context) const {
+  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
+  return cast<XQueryFLWORExpr>(&plain())->firstItems(_most, context);
+}
+
 }  // namespace xquery

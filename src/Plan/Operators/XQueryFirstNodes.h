@@ -40,9 +40,7 @@ class XQueryFirstTuples : public XQueryPlannedExpr {
     return make<XQueryFirstTuples>(std::move(plain), most);
   }
 
-  Value computeValue(XQueryContext& context) const override {
-    return cast<XQueryFLWORExpr>(&plain())->firstItems(_most, context);
-  }
+  Value computeValue(XQueryContext& context) const override;
 
  protected:
   XQueryFirstTuples(Ref<XQueryFLWORExpr> plain, uint64_t most)

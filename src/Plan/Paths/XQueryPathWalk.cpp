@@ -179,6 +179,8 @@ bool XQueryPathWalk::takeLookedUp(size_t index, int axis, NSXMLNode* node) {
   const XQueryWalkedStep& step = _steps[index];
   const bool isOpen = axis == XQueryAxisChild || axis == XQueryAxisDescendant;
   if (!isOpen || listingStep || setsEveryFocus) return false;
+  // Diagnostics would show an error of the value twice.
+  if (context._internal().showsErrors()) return false;
   if (XQueryStepTest(step, *this).onlyName() != step.lookup->element()) return false;
   std::vector<NSXMLNode*>& nodes = openNodeList();
   const bool areFound = step.lookup->find(node, axis, context, nodes);

@@ -108,8 +108,9 @@ std::optional<uint64_t> XQueryWalkedPath::countNodes(uint64_t most, XQueryContex
 }
 
 std::optional<uint64_t> XQueryWalkedPath::countItems(uint64_t most, XQueryContext& context) const {
-  if (_countsNodes) return countNodes(most, context);
-  if (!_steps.empty() || !_picker || showsErrors(context)) {
+  const bool showsAll = showsErrors(context);
+  if (_countsNodes && !showsAll) return countNodes(most, context);
+  if (!_steps.empty() || !_picker || showsAll) {
     const Value items = evaluateWithContext(context);
     if (!items) return std::nullopt;
     return std::min<uint64_t>(XQueryItemList(items.get()).count(), most);
