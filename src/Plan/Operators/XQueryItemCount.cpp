@@ -4,7 +4,6 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/XQuerySequence.h"
-#include "Types/XQueryNumber.h"
 #include "xquery/Number.h"
 
 #include <optional>
@@ -30,31 +29,26 @@ bool XQueryCountsItems(const XQueryExpr& expr) {
   return planned && planned->walkedPath() && planned->walkedPath()->steps().empty();
 }
 
-Value XQueryAnswerTo(XQueryPathCount::Question question, uint64_t count) {
-  if (question.least == 0) return XQueryNumber::integerWithInt64(static_cast<int64_t>(count));
-  return NSNumber::numberWithBool((count >= question.least) != question.isNegated);
-}
-
 Value XQueryItemCount::computeValue(XQueryContext& context) const {
   // Diagnostics show every error that a condition meets.
   if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
   XQueryCheckStack(context);
   const bool isAll = !_mayEndEarly || _question.least == 0;
   const auto count = countItems(*_counted, isAll ? UINT64_MAX : _question.least, context);
-  if (count) return XQueryAnswerTo(_question, *count);
+  if (count) return _question.answer(*count);
   return context._internal().isFailing() ? Value() : plain().evaluateWithContext(context);
 }
 
 Value XQueryKeptCount::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
   const auto count = countItems(plain(), UINT64_MAX, context);
-  return count ? XQueryAnswerTo({}, *count) : Value();
+  return count ? XQueryPathCount::Question{}.answer(*count) : Value();
 }
 
 Value XQueryAskedCount::computeValue(XQueryContext& context) const {
   const auto* count = dyn_cast<NSNumber>(context._internal().variableForID(_varID));
   if (!count) return plain().evaluateWithContext(context);
-  return XQueryAnswerTo(_question, static_cast<uint64_t>(count->integerValue()));
+  return _question.answer(static_cast<uint64_t>(count->integerValue()));
 }
 
 }  // namespace xquery

@@ -11,9 +11,6 @@
 
 namespace xquery {
 
-// What is asked of a number of items, as one of the shared truth values or a new integer.
-Value XQueryAnswerTo(XQueryPathCount::Question question, uint64_t count);
-
 // Whether the expression can count its items without a list of them, perhaps: a FLWOR or a filter.
 // For paths of nodes there is XQueryPathCount.
 bool XQueryCountsItems(const XQueryExpr& expr);

@@ -6,6 +6,11 @@
 
 namespace xquery {
 
+Value XQueryPathCount::Question::answer(uint64_t count) const {
+  if (least == 0) return XQueryNumber::integerWithInt64(static_cast<int64_t>(count));
+  return NSNumber::numberWithBool((count >= least) != isNegated);
+}
+
 void XQueryPathCount::readShortWalk() {
   XQueryShortWalk whole;
   XQueryShortWalk behindPosition;
@@ -40,9 +45,7 @@ Value XQueryPathCount::computeValue(XQueryContext& context) const {
   const uint64_t most = least == 0 ? UINT64_MAX : least;
   const auto count =
       start ? std::optional(countFrom(start, most)) : _path->countNodes(most, context);
-  if (!count) return {};
-  if (least == 0) return XQueryNumber::integerWithInt64(static_cast<int64_t>(*count));
-  return NSNumber::numberWithBool((*count >= least) != _question.isNegated);
+  return count ? _question.answer(*count) : Value();
 }
 
 }  // namespace xquery

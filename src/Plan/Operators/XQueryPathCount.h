@@ -20,6 +20,9 @@ class XQueryPathCount : public XQueryPlannedExpr, private XQueryNodeQuestion {
     // 0: the number itself; else whether there are so many at least.
     uint64_t least = 0;
     bool isNegated = false;
+
+    // A new integer, or one of the shared truth values.
+    Value answer(uint64_t count) const;
   };
 
   // The path countsNodes and is part of the plain expression, or that itself.
