@@ -1,6 +1,7 @@
 #include "Context/StackGuard.h"
 
 #include "Context/XQueryContextInternal.h"
+#include "Platform/Base/Sanitizers.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 
@@ -13,7 +14,7 @@ namespace {
 
 // What must stay free below the deepest checked frame: room for the unchecked work between two
 // checks, for third-party code, and for unwinding an exception. Sanitizer frames are larger.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#if XQUERY_ADDRESS_SANITIZER || XQUERY_THREAD_SANITIZER
 constexpr size_t reserve = 1024 * 1024;
 #else
 constexpr size_t reserve = 256 * 1024;
@@ -23,7 +24,7 @@ constexpr size_t reserve = 256 * 1024;
 // several clauses and constructors a kilobyte and a half, so that a hundred thousand find room, and
 // an endless recursion ends, and leaves what it has used, in a fraction of a second. Code that was
 // not optimized takes several times as much.
-#if defined(__OPTIMIZE__) && !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+#if defined(__OPTIMIZE__) && !XQUERY_ADDRESS_SANITIZER && !XQUERY_THREAD_SANITIZER
 constexpr size_t mostUse = size_t{192} << 20;
 #else
 constexpr size_t mostUse = size_t{1} << 30;

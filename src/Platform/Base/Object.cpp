@@ -21,6 +21,7 @@
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/ObjectBlocks.h"
 #include "Platform/Base/RangeMemory.h"
+#include "Platform/Base/Sanitizers.h"
 #include "Platform/Base/WorkMeter.h"
 #include "xquery/Collection.h"
 #include "xquery/Memory.h"
@@ -38,7 +39,7 @@ namespace xquery {
 
 namespace {
 
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#if XQUERY_ADDRESS_SANITIZER || XQUERY_THREAD_SANITIZER
 constexpr bool usesFreeLists = false;
 #else
 constexpr bool usesFreeLists = true;

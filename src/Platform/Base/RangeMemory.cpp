@@ -1,6 +1,7 @@
 #include "Platform/Base/RangeMemory.h"
 
 #include "Platform/Base/Abandoned.h"
+#include "Platform/Base/Sanitizers.h"
 
 #include <algorithm>
 #include <new>
@@ -12,7 +13,7 @@ namespace xquery {
 namespace {
 
 // Under a sanitizer it sees each block that is given back.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#if XQUERY_ADDRESS_SANITIZER || XQUERY_THREAD_SANITIZER
 constexpr bool keepsBlocks = false;
 #else
 constexpr bool keepsBlocks = true;

@@ -1,5 +1,7 @@
 #include "Platform/Base/RangeRuns.h"
 
+#include "Platform/Base/Sanitizers.h"
+
 #include <algorithm>
 #include <bit>
 #include <new>
@@ -7,15 +9,7 @@
 #include <sys/resource.h>
 #include <utility>
 
-#if defined(__has_feature)
-#if __has_feature(address_sanitizer)
-#define XQUERY_ADDRESS_SANITIZER 1
-#endif
-#elif defined(__SANITIZE_ADDRESS__)
-#define XQUERY_ADDRESS_SANITIZER 1
-#endif
-
-#ifdef XQUERY_ADDRESS_SANITIZER
+#if XQUERY_ADDRESS_SANITIZER
 #include <sanitizer/asan_interface.h>
 #include <sanitizer/lsan_interface.h>
 #endif
@@ -37,7 +31,7 @@ char* roundedDown(char* address, size_t bytes) {
   return address - reinterpret_cast<uintptr_t>(address) % bytes;
 }
 
-#ifdef XQUERY_ADDRESS_SANITIZER
+#if XQUERY_ADDRESS_SANITIZER
 constexpr bool isSanitized = true;
 void forbid(const void* begin, size_t bytes) {
   ASAN_POISON_MEMORY_REGION(begin, bytes);

@@ -1,5 +1,7 @@
 #include "Platform/Base/RangeMemory.h"
 
+#include "Platform/Base/Sanitizers.h"
+
 #include <gtest/gtest.h>
 
 #include <atomic>
@@ -44,7 +46,7 @@ TEST(RangeMemory, AThreadMayGiveBackWhatAnotherTook) {
   giveIdleRangePages();
 }
 
-#ifndef __SANITIZE_THREAD__
+#if !XQUERY_THREAD_SANITIZER
 TEST(RangeMemory, AChildProcessMayTakeBlocksWhateverOtherThreadsDo) {
   std::atomic<bool> isOver = false;
   std::thread other([&] {
