@@ -4,6 +4,7 @@
 
 #include "DataSets.h"
 #include "Engine.h"
+#include "Median.h"
 #include "Queries.h"
 
 #include <algorithm>
@@ -30,12 +31,6 @@ double processorSeconds() {
   timespec time{};
   clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
   return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
-}
-
-double median(std::vector<double> values) {
-  const auto middle = values.begin() + static_cast<std::ptrdiff_t>(values.size() / 2);
-  std::nth_element(values.begin(), middle, values.end());
-  return *middle;
 }
 
 class Phrasing {

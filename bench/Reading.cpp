@@ -2,11 +2,11 @@
 
 #include "DataSets.h"
 #include "Engine.h"
+#include "Median.h"
 #include "OtherReaders.h"
 #include "PeakMemory.h"
 #include "ReadingTexts.h"
 
-#include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <stdexcept>
@@ -53,11 +53,6 @@ double milliseconds(Work work) {
   work();
   const std::chrono::duration<double, std::milli> taken = std::chrono::steady_clock::now() - start;
   return taken.count();
-}
-
-double median(std::vector<double> values) {
-  std::sort(values.begin(), values.end());
-  return values[values.size() / 2];
 }
 
 // Each reader in turn, so that what the machine does besides is everybody's.
