@@ -95,6 +95,7 @@ struct NSXMLParseError {
   int64_t column = 0;
 };
 
+// How many bytes the range of nodes and names takes at most.
 constexpr uintptr_t NSXMLRange = uintptr_t{1} << 35;
 
 // A pointer to something in the range, from a place in it; null for none.

@@ -299,10 +299,6 @@ class RankedOrder {
   std::vector<Column> _columns;
 };
 
-}  // namespace
-
-namespace {
-
 // Leaves the first `most` entries in their order. Of equal ones the earlier is the first.
 void keepFirst(std::vector<Entry>& entries, size_t most, RankedOrder& order) {
   const auto isBefore = [&order](const Entry& a, const Entry& b) {

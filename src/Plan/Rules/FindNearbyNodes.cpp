@@ -2,9 +2,8 @@
 //
 // Pattern     P intersect $v and $v intersect P, where P is a short path with a step at least and
 //             $v a local variable
-// Facts       none are asked for: at each use it is asked whether the path starts from one node,
-// and
-//             whether the variable holds one
+// Facts       none are asked for: at each use it is asked whether the path starts from one node
+//             and whether the variable holds one
 // Operator    XQueryNearbyNode: the walk ends where it meets the node, and no list is made
 // Why         from one node a short path raises no error, and one node is in the intersection when
 //             the path finds it; whatever else there is, is left to the intersection

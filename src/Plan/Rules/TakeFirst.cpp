@@ -1,9 +1,8 @@
 // The first items of a path, and of what is sorted.
 //
-// Pattern     subsequence(E, 1, 3), (E)[1], (E)[position() <= 3], with any small numbers; the same
-// of
-//             a variable that "let" sets to E, where every use of it is such; for $x at $i in E ...
-//             where $i <= 3 ...
+// Pattern     subsequence(E, 1, 3), (E)[1], (E)[position() <= 3], with any small numbers; the
+//             same of a variable that "let" sets to E, where every use of it is such; for $x at $i
+//             in E ... where $i <= 3 ...
 // Facts       E is a path that finds its nodes in document order from one node, and that can be
 //             walked in part (XQueryWalkedPath::findsInOrder), a FLWOR with order specs, or one of
 //             which what is behind an item cannot fail and does nothing (EarlyEnds.h); clauses
@@ -13,9 +12,8 @@
 //             XQueryFirstTuples for a FLWOR: only so many are put into their order, once everything
 //             has been evaluated, or no more tuples are made than that takes
 // Why         what is behind these items cannot be told from what is not there, since the whole
-// asks
-//             neither for it nor for the number of items. Whether keys can be compared is found out
-//             for all of them
+//             asks neither for it nor for the number of items. Whether keys can be compared is
+//             found out for all of them
 #include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryPath.h"

@@ -6,9 +6,8 @@
 //             (StepsAround.h)
 // Operator    none: the predicate is the number, so that the step walks no further than that; an
 //             expression is evaluated once for the nodes of the step and not for each of them
-// Why         a number in a predicate asks for that position; without nodes it is not evaluated,
-// and
-//             an error in it drops each of them
+// Why         a number in a predicate asks for that position; without nodes it is not evaluated
+//             and an error in it drops each of them
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Planning.h"

@@ -1,10 +1,9 @@
 // The arena of a tree.
 //
-//   NSXMLTree (48 bytes)        block of one node           block of a builder        block of a
-//   text
-//     count, order, blocks        head: tree, next            head                      head
-//     last block ---------------> node                        node [its text]           view of it
-//     names                       [its text]                  node [its text] ...       text
+//   NSXMLTree (48 bytes)       block of one node      block of a builder     block of a text
+//     count, order, blocks       head: tree, next       head                   head
+//     last block --------------> node                   node [its text]        view of it
+//     names                      [its text]             node [its text] ...    text
 //     base URIs on record
 //     indexes, era
 //
