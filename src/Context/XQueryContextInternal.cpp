@@ -103,6 +103,15 @@ const NSXMLNode* XQueryContextInternal::inScopeNamespaceForPrefix(NSStringView p
   return _inScopeNamespaces.forPrefix(prefix);
 }
 
+NSXMLNameRef XQueryContextInternal::declarationName(NSStringView prefix) {
+  for (const NSXMLNameRef& name : _declarationNames) {
+    if (name && name->text == prefix) return name;
+  }
+  NSXMLNameRef& place = _declarationNames[_oldestDeclarationName];
+  _oldestDeclarationName = (_oldestDeclarationName + 1) % _declarationNames.size();
+  return place = NSXMLNameRef(prefix, NSStringView());
+}
+
 Ref<NSString> XQueryContextInternal::contextNamespaceForPrefix(NSStringView prefix) const {
   const auto found = _contextNamespaces.find(prefix.utf8());
   return found == _contextNamespaces.end() ? Ref<NSString>() : found->second;

@@ -6,6 +6,7 @@
 #include "Context/XQueryFrame.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Loading/NSURLLoader.h"
+#include "Platform/Tree/Names.h"
 #include "Prolog/XQueryNamespaceStack.h"
 #include "Types/XQueryBaseURIs.h"
 #include "Types/XQueryQName.h"
@@ -14,6 +15,7 @@
 #include "xquery/XMLNode.h"
 #include "xquery/XQuery.h"
 
+#include <array>
 #include <map>
 #include <memory>
 #include <string>
@@ -89,6 +91,9 @@ class XQueryContextInternal {
   Ref<NSString> firstPrefixForNamespace(const Ref<NSString>& URI) const;
   // The innermost constructor's declaration of the prefix; null when none declares it.
   const NSXMLNode* inScopeNamespaceForPrefix(NSStringView prefix) const;
+  // The name of a declaration of the prefix. Names are looked up under a lock, and constructors
+  // declare the same few prefixes over and over.
+  NSXMLNameRef declarationName(NSStringView prefix);
   Ref<NSString> contextNamespaceForPrefix(NSStringView prefix) const;
   bool hasDefaultNamespace() const {
     return !_contextNamespaces.empty() && _contextNamespaces.contains(std::string());
@@ -163,6 +168,7 @@ class XQueryContextInternal {
   void clearKept() {
     _keptValues.clear();
     _baseURIs.clear();
+    _declarationNames = {};
   }
   // The regular expressions compiled last; null until the first one.
   std::shared_ptr<XQueryRegExCache>& regExCache() { return _regExCache; }
@@ -178,6 +184,8 @@ class XQueryContextInternal {
 
   XQueryFrameRef _variables;
   XQueryNamespaceStack _inScopeNamespaces;
+  std::array<NSXMLNameRef, 4> _declarationNames;  // those asked for last
+  size_t _oldestDeclarationName = 0;
   const uint64_t _baseURIOwner;  // this context's number among those that record base URIs
   size_t _baseURINodeCount = 0;
   // The URI given last, and a copy of it that refers to no tree.

@@ -73,7 +73,14 @@ void XQuerySequence::replaceObjectAtIndex(size_t index, const Value& withObject)
 Value normalised(Value value) {
   const auto* array = dyn_cast<NSArray>(value);
   if (!array || array->count() > 1) return value;
-  return array->count() == 1 ? array->objects().front() : Value(NSNull::null());
+  return normalisedIn(value);
+}
+
+const Value& normalisedIn(const Value& value) {
+  static const Value empty(NSNull::null());
+  const auto* array = dyn_cast<NSArray>(value);
+  if (!array || array->count() > 1) return value;
+  return array->count() == 1 ? array->objects().front() : empty;
 }
 
 Value flattened(Value value) {

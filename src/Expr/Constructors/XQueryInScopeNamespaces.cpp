@@ -49,7 +49,8 @@ bool XQueryInScopeNamespaces::updateNamespacesForElement(NSXMLElement& element,
   const NSStringView prefix = NSXMLPrefixOf(qName);
   const NSStringView URI = NSXMLURIOf(*qName.expanded);
   if (URI.isEmpty() || isPredefined(prefix) || isDeclaredAs(prefix, URI, _context)) return false;
-  const Ref<NSXMLNode> declaration = NSXMLNode::namespaceWithName(prefix, URI);
+  NSXMLNameRef name = _context.declarationName(prefix);
+  const Ref<NSXMLNode> declaration(NSXMLTree::makeLoneNode(Kind::Namespace, URI, name.detach()));
   declare(element, *declaration);
   push({declaration});
   return true;

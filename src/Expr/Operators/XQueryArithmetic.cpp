@@ -321,12 +321,32 @@ constexpr Row rows[] = {
     {XQueryOperatorDiv, isSeconds, isSeconds, op_divide_durations},
 };
 
-// A node becomes its untyped value, and an untyped value a number.
-void makeNumberIfUntyped(Value& operand, XQueryTypeID numberType, XQueryContext& context) {
-  if (XQueryIsNode(operand.get())) operand = XQueryAtomization(operand, context);
-  if (XQueryObjectTypeID(operand.get()) != XQueryTypeUntypedAtomic) return;
-  operand = XQueryCastAsTypeForContext(operand, numberType, context);
-}
+// An operand as it stands, or the number that it becomes. What stands is held by whoever gave it: a
+// count here would be one more of a constant that other threads count as well.
+class Operand {
+ public:
+  explicit Operand(const Value& given) : _value(&normalisedIn(given)) {}
+  Operand(const Operand&) = delete;
+  Operand& operator=(const Operand&) = delete;
+
+  const Value& operator*() const { return *_value; }
+
+  // A node becomes its untyped value, and an untyped value a number.
+  void makeNumberIfUntyped(XQueryTypeID numberType, XQueryContext& context) {
+    if (XQueryIsNode(_value->get())) become(XQueryAtomization(*_value, context));
+    if (XQueryObjectTypeID(_value->get()) != XQueryTypeUntypedAtomic) return;
+    become(XQueryCastAsTypeForContext(*_value, numberType, context));
+  }
+
+ private:
+  void become(Value value) {
+    _own = std::move(value);
+    _value = &_own;
+  }
+
+  const Value* _value;
+  Value _own;
+};
 
 bool isOrderedDuration(const Value& value) {
   return XQueryIsKindOfType(XQueryObjectTypeID(value.get()), XQueryTypeDuration) &&
@@ -352,36 +372,36 @@ bool dividesByZero(int type, const Value& left, const Value& right) {
 Value XQueryOperatorExpr::arithmeticOperatorEvaluate(int type, const Value& withLeft,
                                                      const Value& right,
                                                      XQueryContext& forContext) {
-  Value a = normalised(withLeft);
-  Value b = normalised(right);
-  if (!a || !b) return Value();
-  if (isNull(a) || isNull(b)) return NSNull::null();
-  if (isa<NSArray>(a) || isa<NSArray>(b)) return Value();
+  Operand a(withLeft);
+  Operand b(right);
+  if (!*a || !*b) return Value();
+  if (isNull(*a) || isNull(*b)) return NSNull::null();
+  if (isa<NSArray>(*a) || isa<NSArray>(*b)) return Value();
   const XQueryTypeID untypedAs = type == XQueryOperatorIDiv ? XQueryTypeInteger : XQueryTypeDouble;
-  makeNumberIfUntyped(a, untypedAs, forContext);
-  makeNumberIfUntyped(b, untypedAs, forContext);
-  if (dividesByZero(type, a, b)) return XQueryErrors::divideByZero.error();
-  const XQueryTypeID leftType = XQueryObjectTypeID(a.get());
-  const XQueryTypeID rightType = XQueryObjectTypeID(b.get());
+  a.makeNumberIfUntyped(untypedAs, forContext);
+  b.makeNumberIfUntyped(untypedAs, forContext);
+  if (dividesByZero(type, *a, *b)) return XQueryErrors::divideByZero.error();
+  const XQueryTypeID leftType = XQueryObjectTypeID((*a).get());
+  const XQueryTypeID rightType = XQueryObjectTypeID((*b).get());
   for (const Row& row : rows) {
     if (row.type == type && row.left(leftType) && row.right(rightType)) {
-      return row.work(a, b, forContext);
+      return row.work(*a, *b, forContext);
     }
   }
   return Value();
 }
 
 Value XQueryUnarySign(int type, const Value& operand, XQueryContext& context) {
-  Value number = normalised(operand);
-  if (!number) return Value();
-  if (isNull(number)) return NSNull::null();
-  if (isa<NSArray>(number)) return Value();
-  makeNumberIfUntyped(number, XQueryTypeDouble, context);
-  const XQueryTypeID numberType = XQueryObjectTypeID(number.get());
+  Operand number(operand);
+  if (!*number) return Value();
+  if (isNull(*number)) return NSNull::null();
+  if (isa<NSArray>(*number)) return Value();
+  number.makeNumberIfUntyped(XQueryTypeDouble, context);
+  const XQueryTypeID numberType = XQueryObjectTypeID((*number).get());
   if (!XQueryIsNumericTypeID(numberType)) return Value();
   const NumericWork& work = type == XQueryOperatorMinus ? subtraction : addition;
   // The zero is not asked to be of the type: some derived integer types have none.
-  const Value result = compute(work, *XQueryNumber::zero(), numberIn(number), numberType);
+  const Value result = compute(work, *XQueryNumber::zero(), numberIn(*number), numberType);
   return XQueryCastAsTypeForContext(result, numberType, context);
 }
 
