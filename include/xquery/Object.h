@@ -180,7 +180,8 @@ class XQUERY_EXPORT NSCounted : public NSObject {
   // For shared singletons: from now on the object is never freed.
   void makeImmortal() const { _word |= immortalBit; }
   bool isImmortal() const { return (_word & immortalBit) != 0; }
-  bool hasOneReference() const { return _word == 1; }
+  // Whether nobody but the caller holds the object; what others did with it is done then.
+  bool hasOneReference() const { return __atomic_load_n(&_word, __ATOMIC_ACQUIRE) == 1; }
 
   // Blocks up to 128 bytes come from per-thread free lists.
   static void* operator new(size_t size);
