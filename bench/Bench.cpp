@@ -1,6 +1,7 @@
 // xquery_bench [--factor=F] [--scaling | --functions | --threads[=TEXT] | --reading]
 //              [Google Benchmark options]
 // xquery_bench [--factor=F] --phrasings [--limit=SECONDS] [--ideas=TEXT]
+// xquery_bench [--factor=F] --planning [--ideas=TEXT]     (best with a factor of 0.001)
 //
 // Measures the tree build, single steps (some with the memory that each takes at the peak), a table
 // of paths, each beside the peer's figure from the same run, and the twenty numbered queries of
@@ -13,6 +14,7 @@
 #include "PeakMemory.h"
 #include "Peer.h"
 #include "Phrasings.h"
+#include "Planning.h"
 #include "Queries.h"
 #include "Reading.h"
 #include "Scaling.h"
@@ -221,7 +223,7 @@ void registerAll() {
 
 struct Options {
   bench::PhrasingOptions measured;  // the factor is everybody's
-  bool scaling = false, phrasings = false, reading = false;
+  bool scaling = false, phrasings = false, planning = false, reading = false;
 };
 
 // Leaves `value` as it is when the text is no number within the bounds.
@@ -252,6 +254,8 @@ std::optional<Options> takeOptions(int& argc, char** argv) {
       options.reading = true;
     } else if (argument == "--phrasings") {
       options.phrasings = true;
+    } else if (argument == "--planning") {
+      options.planning = true;
     } else {
       argv[kept++] = argv[i];
     }
@@ -279,6 +283,9 @@ int main(int argc, char** argv) {
   if (options->scaling) return bench::reportScaling();
   if (options->reading) return bench::reportReading(options->measured.factor);
   if (options->phrasings) return bench::reportPhrasings(options->measured);
+  if (options->planning) {
+    return bench::reportPlanning(options->measured.factor, options->measured.ideas);
+  }
   benchmark::Initialize(&argc, argv);
   if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 2;
   prepare(options->measured.factor);

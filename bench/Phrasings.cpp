@@ -1,18 +1,12 @@
-// The phrasings of an idea are evaluated in turns, so that what else the machine does falls on all
-// of them alike. A turn lasts at least some milliseconds: short evaluations are repeated in it.
 #include "Phrasings.h"
 
 #include "DataSets.h"
 #include "Engine.h"
-#include "Median.h"
 #include "Queries.h"
+#include "TimedQuery.h"
 
 #include <algorithm>
-#include <chrono>
-#include <cmath>
 #include <cstdio>
-#include <ctime>
-#include <optional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -22,74 +16,18 @@ namespace {
 
 using namespace xquery;
 
-constexpr double turn = 0.003;         // seconds that a turn lasts at least
-constexpr int turns = 7;               // unless they take too long together:
-constexpr double secondsForTurns = 2;  // of one phrasing; one turn there is always
-constexpr double allowed = 2;          // times the fastest
+constexpr int turns = 7;       // unless they take too long together
+constexpr double allowed = 2;  // times the fastest
 
-double processorSeconds() {
-  timespec time{};
-  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
-  return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
-}
-
-class Phrasing {
+class Phrasing : public TimedQuery {
  public:
   Phrasing(const PhrasedQuery& query, const Value& document, double limit)
-      : _name(query.phrasing),
-        _document(document),
-        _query(compile(query.text)),
-        _context(XQueryContext::xqueryContext()) {
-    XQueryLimits limits;
-    limits.duration = std::chrono::nanoseconds(std::llround(limit * 1e9));
-    _context->contextSetLimits(limits);
-    const double start = processorSeconds();
-    std::string error;
-    const Ref<NSArray> items = evaluated(error);
-    _first = processorSeconds() - start;
-    if (items) {
-      _answer = printed(*items);
-    } else if (error.find("limit: deadline passed") == std::string::npos) {
-      _answer = error;
-    }
-  }
+      : TimedQuery(compile(query.text), document, limit), _name(query.phrasing) {}
 
   const std::string& name() const { return _name; }
-  bool isOver() const { return !_answer; }
-  // The printed result, or the error; nothing over the limit.
-  const std::optional<std::string>& answer() const { return _answer; }
-  // Of one evaluation; of one that is over the limit, what it took until it was ended.
-  double seconds() const { return _turns.empty() ? _first : median(_turns); }
-
-  void takeTurn() {
-    if (isOver() || _spent > secondsForTurns) return;
-    const int repeat = static_cast<int>(std::clamp(turn / std::max(_first, 1e-7), 1.0, 10000.0));
-    std::string error;
-    const double start = processorSeconds();
-    for (int i = 0; i < repeat; i++) {
-      if (!evaluated(error)) return;  // What is this close to the limit keeps its first time.
-    }
-    const double taken = processorSeconds() - start;
-    _turns.push_back(taken / repeat);
-    _spent += taken;
-  }
 
  private:
-  // Null with an error.
-  Ref<NSArray> evaluated(std::string& message) {
-    Ref<XQueryError> error;
-    Ref<NSArray> items = _context->evaluateXQuery(*_query, {}, _document, &error);
-    if (!items) message = error ? error->description()->utf8() : "no result";
-    return items;
-  }
-
   std::string _name;
-  Value _document;
-  Ref<XQuery> _query;
-  Ref<XQueryContext> _context;
-  std::optional<std::string> _answer;
-  double _first = 0, _spent = 0;
-  std::vector<double> _turns;
 };
 
 struct IdeaResult {

@@ -9,6 +9,7 @@
 
 #include "AuctionData.h"
 #include "Engine.h"
+#include "ProcessorTime.h"
 
 #include <algorithm>
 #include <barrier>
@@ -21,7 +22,6 @@
 #include <string_view>
 #include <sys/wait.h>
 #include <thread>
-#include <time.h>
 #include <unistd.h>
 #include <utility>
 #include <vector>
@@ -91,13 +91,6 @@ struct Figure {
   double rate = 0;           // evaluations in a second
   double processorTime = 0;  // of one evaluation, in seconds
 };
-
-// What the calling thread has taken so far.
-double processorSeconds() {
-  timespec time = {};
-  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
-  return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
-}
 
 // How long the calling thread was ready to run and did not, for want of a processor. 0 where the
 // kernel does not tell.
