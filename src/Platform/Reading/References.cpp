@@ -80,17 +80,47 @@ size_t lengthOfLineEnd(std::string_view bytes) {
   return bytes.size() > 1 && bytes[1] == '\n' ? 2 : 1;
 }
 
+// Where some bytes are in a text, looked for from left to right. Each of them is looked for by
+// itself: going over the text for one byte is so much quicker than for several at once.
+class Places {
+ public:
+  static constexpr size_t mostBytes = 4;
+
+  Places(const char* end, std::string_view sought) : _end(end), _sought(sought) {}
+  // The first of any of them; the end of the text if there is none.
+  const char* firstFrom(const char* at) {
+    const char* first = _end;
+    for (size_t which = 0; which < _sought.size(); ++which) {
+      const char*& next = _next[which];
+      if (!next || next < at) next = findInBlocks(at, _end, _sought[which]);
+      first = std::min(first, next);
+    }
+    return first;
+  }
+
+ private:
+  const char* const _end;
+  const std::string_view _sought;
+  const char* _next[mostBytes] = {};
+};
+
 // Goes over the bytes and has `replace` append what stands for those of `special`.
 template <class Replace>
 void appendReplaced(std::string_view bytes, std::string_view special, ValueText<char>& text,
                     Replace replace) {
+  const char* at = bytes.data();
+  const char* const end = at + bytes.size();
+  Places places(end, special);
+  const auto viewTo = [&at](const char* to) {
+    return std::string_view(at, static_cast<size_t>(to - at));
+  };
   WorkPacer pacer;
-  while (!bytes.empty()) {
+  while (at < end) {
     pacer.turn();
-    const size_t plain = std::min(bytes.find_first_of(special), bytes.size());
-    appendInBlocks(text, bytes.substr(0, plain));
-    bytes.remove_prefix(plain);
-    if (!bytes.empty()) bytes.remove_prefix(replace(bytes));
+    const char* const next = places.firstFrom(at);
+    appendInBlocks(text, viewTo(next));
+    at = next;
+    if (at < end) at += replace(viewTo(end));
   }
 }
 

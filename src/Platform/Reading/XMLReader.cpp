@@ -34,18 +34,6 @@ bool isAt(const char* at, const char* end, std::string_view word) {
          std::memcmp(at, word.data(), word.size()) == 0;
 }
 
-// The first such byte, or `end`.
-const char* findByte(const char* at, const char* end, char byte) {
-  constexpr size_t bytesPerStep = size_t{1} << 16;
-  while (at < end) {
-    const size_t count = std::min(static_cast<size_t>(end - at), bytesPerStep);
-    if (const void* found = std::memchr(at, byte, count)) return static_cast<const char*>(found);
-    at += count;
-    checkWork();
-  }
-  return end;
-}
-
 class XMLReader {
  public:
   XMLReader(TextSource& source, uint32_t options)
@@ -405,7 +393,7 @@ ReadText XMLReader::linesOf(Raw raw) {
 const char* XMLReader::readComment(const char* at) {
   const char* const begin = at + 4;
   for (at = begin;; ++at) {
-    at = findByte(at, _end, '-');
+    at = findInBlocks(at, _end, '-');
     if (_end - at < 3) return nullptr;
     if (at[1] == '-') break;
   }
@@ -418,7 +406,7 @@ const char* XMLReader::readSection(const char* at) {
   take(!_open.empty());
   const char* const begin = at + sectionStart.size();
   for (at = begin;; ++at) {
-    at = findByte(at, _end, ']');
+    at = findInBlocks(at, _end, ']');
     if (_end - at < 3) return nullptr;
     if (at[1] == ']' && at[2] == '>') break;
   }
@@ -440,7 +428,7 @@ const char* XMLReader::readInstruction(const char* at) {
   take(!isReservedTarget(target) && (*at != '?' || at[1] == '>'));
   const char* const begin = skipSpace(at);
   for (at = begin;; ++at) {
-    at = findByte(at, _end, '?');
+    at = findInBlocks(at, _end, '?');
     if (_end - at < 2) return nullptr;
     if (at[1] == '>') break;
   }

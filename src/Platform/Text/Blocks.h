@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <cstring>
 #include <new>
 #include <string>
 #include <string_view>
@@ -28,6 +29,18 @@ void inBlocks(std::basic_string_view<Text> text, Work work) {
     checkWork();
   }
   work(text);
+}
+
+// The first such byte, or `end`.
+inline const char* findInBlocks(const char* at, const char* end, char byte) {
+  constexpr size_t bytesPerStep = size_t{1} << 16;  // these are passed quickly
+  while (at < end) {
+    const size_t count = std::min(static_cast<size_t>(end - at), bytesPerStep);
+    if (const void* found = std::memchr(at, byte, count)) return static_cast<const char*>(found);
+    at += count;
+    checkWork();
+  }
+  return end;
 }
 
 // Text that counts as memory of values while it is put together.
