@@ -3,8 +3,11 @@
 // is not linked, and the choice is our own: loading that library takes longer than the command does
 // to start.
 #include "Platform/Reading/ByteMarks.h"
+#include "Platform/Reading/Widening.h"
 
+#include <algorithm>
 #include <cstring>
+#include <iterator>
 
 // Half of the vectors' width is enough: what is marked is read a byte at a time.
 #define HWY_DISABLED_TARGETS (HWY_AVX3 | HWY_AVX3_DL)
@@ -24,12 +27,18 @@ void markByVectors(const char* bytes, size_t count, ByteMarks* marks) {
   markBytesPlainly(bytes, count, marks);
 }
 
+Widened widenByVectors(std::string_view bytes, char16_t* units) {
+  return widenSomePlainly(bytes, units);
+}
+
 #else
 
 namespace hn = hwy::HWY_NAMESPACE;
 
 using Bytes = hn::CappedTag<uint8_t, bytesPerMarks>;
 using Vector = hn::Vec<Bytes>;
+
+// --- marks -----------------------------------------------------------------------------------
 
 // A bit for each byte that has one of the classes.
 HWY_INLINE void storeClasses(Bytes tag, Vector classes, uint8_t wanted, uint8_t* bits) {
@@ -59,6 +68,213 @@ HWY_ATTR void markByVectors(const char* bytes, size_t count, ByteMarks* marks) {
   }
 }
 
+// --- widening --------------------------------------------------------------------------------
+
+using Sixteen = hn::FixedTag<uint8_t, 16>;
+using Some = hn::Vec<Sixteen>;
+using Units = hn::FixedTag<uint16_t, 8>;
+using Points = hn::FixedTag<uint32_t, 4>;
+using PointVector = hn::Vec<Points>;
+
+constexpr size_t bytesOfBlock = 64;
+// A step reads and writes as much, whatever it takes and makes.
+constexpr size_t bytesOfStep = 16;
+// Where the last step of a block may begin: the end of a character shows at the byte behind it.
+constexpr size_t stepsEnd = bytesOfBlock - WideningTables::bytesLookedAt;
+// How far a fault reaches back.
+constexpr size_t bytesBefore = 3;
+
+HWY_INLINE Vector entries(const uint8_t (&table)[16], Vector places) {
+  return hn::TableLookupBytes(hn::LoadDup128(Bytes(), table), places);
+}
+
+// Not zero for each byte that makes the text something else than XML's.
+HWY_INLINE Vector faults(const uint8_t* bytes) {
+  const Bytes tag;
+  const Vector here = hn::LoadU(tag, bytes);
+  const Vector last = hn::LoadU(tag, bytes - 1);
+  const Vector last2 = hn::LoadU(tag, bytes - 2);
+  const Vector last3 = hn::LoadU(tag, bytes - bytesBefore);
+  const Vector lastLower = entries(utf8faults::firstLower, hn::And(last, hn::Set(tag, 15)));
+  const Vector lastUpper = entries(utf8faults::firstUpper, hn::ShiftRight<4>(last));
+  const Vector upper = entries(utf8faults::secondUpper, hn::ShiftRight<4>(here));
+  const Vector found = hn::And(hn::And(lastLower, lastUpper), upper);
+  // The top bit for third and fourth bytes.
+  const Vector later = hn::Or(hn::SaturatedSub(last2, hn::Set(tag, 0xE0 - 0x80)),
+                              hn::SaturatedSub(last3, hn::Set(tag, 0xF0 - 0x80)));
+  const Vector misplaced = hn::Xor(hn::And(later, hn::Set(tag, utf8faults::Follows)), found);
+  // U+FFFE and U+FFFF.
+  const auto isNone =
+      hn::And(hn::And(hn::Eq(last2, hn::Set(tag, 0xEF)), hn::Eq(last, hn::Set(tag, 0xBF))),
+              hn::Eq(hn::Or(here, hn::Set(tag, 1)), hn::Set(tag, 0xBF)));
+  return hn::Or(misplaced, hn::VecFromMask(tag, isNone));
+}
+
+// Looks at a block that a character begins, and at the bytes before it. Whether it is text, but for
+// what its last character may lack; `ends` has a bit for each byte but the last one that is the
+// last of a character.
+HWY_INLINE bool readBlock(const uint8_t* bytes, uint64_t& ends) {
+  const Bytes tag;
+  Vector bad = hn::Zero(tag);
+  uint64_t starts = 0;
+  for (size_t at = 0; at < bytesOfBlock; at += hn::Lanes(tag)) {
+    bad = hn::Or(bad, faults(bytes + at));
+    const Vector upper = hn::And(hn::LoadU(tag, bytes + at), hn::Set(tag, 0xC0));
+    uint64_t bits = 0;
+    hn::StoreMaskBits(tag, hn::Ne(upper, hn::Set(tag, 0x80)), reinterpret_cast<uint8_t*>(&bits));
+    starts |= bits << at;
+  }
+  ends = starts >> 1;
+  return hn::AllTrue(tag, hn::Eq(bad, hn::Zero(tag)));
+}
+
+HWY_INLINE void storeASCII(Some bytes, char16_t* to) {
+  const Units units;
+  const Some zero = hn::Zero(Sixteen());
+  auto* const out = reinterpret_cast<uint16_t*>(to);
+  hn::StoreU(hn::ZipLower(units, bytes, zero), units, out);
+  hn::StoreU(hn::ZipUpper(units, bytes, zero), units, out + hn::Lanes(units));
+}
+
+// Eight characters of two bytes.
+HWY_INLINE void storePairs(Some bytes, char16_t* to) {
+  const Units units;
+  const auto pairs = hn::BitCast(units, bytes);
+  const auto upper = hn::ShiftLeft<6>(hn::And(pairs, hn::Set(units, 0x1F)));
+  const auto lower = hn::And(hn::ShiftRight<8>(pairs), hn::Set(units, 0x3F));
+  hn::StoreU(hn::Or(upper, lower), units, reinterpret_cast<uint16_t*>(to));
+}
+
+// Characters of one or two bytes, in lanes.
+HWY_INLINE void storeShort(Some lanes, char16_t* to) {
+  const Units units;
+  const auto pairs = hn::BitCast(units, lanes);
+  const auto lower = hn::And(pairs, hn::Set(units, 0x7F));
+  const auto upper = hn::ShiftRight<2>(hn::And(pairs, hn::Set(units, 0x1F00)));
+  hn::StoreU(hn::Or(lower, upper), units, reinterpret_cast<uint16_t*>(to));
+}
+
+// Of characters in lanes, the code points.
+HWY_INLINE PointVector points(Some lanes) {
+  const Points tag;
+  const auto all = hn::BitCast(tag, lanes);
+  const auto first = hn::And(all, hn::Set(tag, 0x7F));
+  const auto second = hn::ShiftRight<2>(hn::And(all, hn::Set(tag, 0x3F00)));
+  // A lead of three bytes has a bit here that bytes which go on have not.
+  const auto lead = hn::ShiftRight<1>(hn::And(all, hn::Set(tag, 0x400000)));
+  const auto third = hn::ShiftRight<4>(hn::Xor(hn::And(all, hn::Set(tag, 0x3F0000)), lead));
+  const auto fourth = hn::ShiftRight<6>(hn::And(all, hn::Set(tag, 0x07000000)));
+  return hn::Or(hn::Or(first, second), hn::Or(third, fourth));
+}
+
+// Of three characters. Which of them take two units is nothing that a processor could foresee.
+HWY_INLINE char16_t* storePoints(PointVector found, char16_t* to) {
+  uint32_t each[4];
+  hn::StoreU(found, Points(), each);
+  for (size_t which = 0; which < 3; ++which) {
+    const uint32_t point = each[which];
+    const bool isPair = point >= 0x10000;
+    const uint32_t units = 0xDC00D7C0 + (point >> 10) + ((point & 0x3FF) << 16);
+    const uint32_t stored = isPair ? units : point;
+    std::memcpy(to, &stored, sizeof stored);
+    to += isPair ? 2 : 1;
+  }
+  return to;
+}
+
+// Widens a block that is text from its beginning until so many bytes are done; answers how many
+// that came to.
+HWY_INLINE size_t widenBlock(const WideningTables& tables, const uint8_t* bytes, uint64_t ends,
+                             size_t wanted, char16_t*& to) {
+  const Sixteen tag;
+  size_t at = 0;
+  while (at < wanted) {
+    const Some here = hn::LoadU(tag, bytes + at);
+    const uint64_t next = ends >> at;
+    if ((next & 0xFFFF) == 0xFFFF) {
+      storeASCII(here, to);
+      to += 16;
+      at += 16;
+      continue;
+    }
+    if ((next & 0xFFFF) == 0xAAAA) {
+      storePairs(here, to);
+      to += 8;
+      at += 16;
+      continue;
+    }
+    const WideningTables::Step step = tables.steps[next % std::size(tables.steps)];
+    const Some lanes = hn::TableLookupBytesOr0(here, hn::Load(tag, tables.shuffles[step.shuffle]));
+    if (step.shuffle < WideningTables::firstOfFour) {
+      storeShort(lanes, to);
+      to += 6;
+    } else if (step.shuffle < WideningTables::firstOfThree) {
+      hn::StoreU(hn::TruncateTo(hn::FixedTag<uint16_t, 4>(), points(lanes)),
+                 hn::FixedTag<uint16_t, 4>(), reinterpret_cast<uint16_t*>(to));
+      to += 4;
+    } else {
+      to = storePoints(points(lanes), to);
+    }
+    at += step.bytes;
+  }
+  return at;
+}
+
+// Of fewer bytes than two such parts. Compilers make any loop an instruction that takes long to
+// begin.
+template <size_t Part>
+HWY_INLINE void copyFew(char* to, const char* from, size_t count) {
+  if (count & Part) {
+    std::memcpy(to, from, Part);
+    to += Part;
+    from += Part;
+  }
+  if constexpr (Part > 1) copyFew<Part / 2>(to, from, count);
+}
+
+// A part of a text that has nothing before it or behind it that may be read, and no room for units
+// that are not wanted: in a place of its own, between zeros.
+HWY_INLINE Widened widenApart(const WideningTables& tables, std::string_view bytes,
+                              char16_t* units) {
+  constexpr size_t most = bytesOfBlock + bytesOfStep;
+  uint8_t copy[bytesOfStep + most] = {};
+  uint8_t* const block = copy + bytesOfStep;
+  char16_t room[most];
+  copyFew<64>(reinterpret_cast<char*>(block), bytes.data(), std::min(bytes.size(), most));
+  uint64_t ends = 0;
+  if (!readBlock(block, ends)) return {0, 0};
+  char16_t* to = room;
+  size_t done = widenBlock(tables, block, ends, std::min(bytes.size(), stepsEnd), to);
+  if (done > bytes.size()) {
+    to -= done - bytes.size();
+    done = bytes.size();
+  }
+  const auto count = static_cast<size_t>(to - room);
+  copyFew<128>(reinterpret_cast<char*>(units), reinterpret_cast<const char*>(room),
+               count * sizeof(char16_t));
+  return {done, count};
+}
+
+HWY_ATTR Widened widenByVectors(std::string_view bytes, char16_t* units) {
+  static const WideningTables tables;
+  size_t done = 0;
+  char16_t* to = units;
+  uint64_t ends = 0;
+  while (done < std::min(bytes.size(), widenedAtOnce)) {
+    if (done < bytesBefore || bytes.size() - done < bytesOfBlock + bytesOfStep) {
+      const Widened part = widenApart(tables, bytes.substr(done), to);
+      if (!part.bytes) break;
+      done += part.bytes;
+      to += part.units;
+      continue;
+    }
+    const auto* const block = reinterpret_cast<const uint8_t*>(bytes.data() + done);
+    if (!readBlock(block, ends)) break;
+    done += widenBlock(tables, block, ends, stepsEnd, to);
+  }
+  return {done, static_cast<size_t>(to - units)};
+}
+
 #endif
 
 }  // namespace
@@ -70,33 +286,44 @@ HWY_AFTER_NAMESPACE();
 namespace xquery {
 namespace {
 
-using Marking = void (*)(const char* bytes, size_t count, ByteMarks* marks);
-
 // The best that the processor has, or what is compiled for all of them.
-Marking bestMarking() {
+struct VectorCode {
+  void (*mark)(const char* bytes, size_t count, ByteMarks* marks);
+  Widened (*widen)(std::string_view bytes, char16_t* units);
+};
+
+VectorCode bestCode() {
 #if HWY_ARCH_X86 && (HWY_TARGETS & HWY_AVX2)
   if (__builtin_cpu_supports("avx2") && __builtin_cpu_supports("fma") &&
       __builtin_cpu_supports("bmi") && __builtin_cpu_supports("bmi2")) {
-    return N_AVX2::markByVectors;
+    return {N_AVX2::markByVectors, N_AVX2::widenByVectors};
   }
 #endif
 #if HWY_ARCH_X86 && (HWY_TARGETS & HWY_SSE4)
   if (__builtin_cpu_supports("sse4.2") && __builtin_cpu_supports("aes") &&
       __builtin_cpu_supports("pclmul")) {
-    return N_SSE4::markByVectors;
+    return {N_SSE4::markByVectors, N_SSE4::widenByVectors};
   }
 #endif
 #if HWY_ARCH_X86 && (HWY_TARGETS & HWY_SSSE3)
-  if (__builtin_cpu_supports("ssse3")) return N_SSSE3::markByVectors;
+  if (__builtin_cpu_supports("ssse3")) return {N_SSSE3::markByVectors, N_SSSE3::widenByVectors};
 #endif
-  return HWY_STATIC_DISPATCH(markByVectors);
+  return {HWY_STATIC_DISPATCH(markByVectors), HWY_STATIC_DISPATCH(widenByVectors)};
+}
+
+const VectorCode& vectorCode() {
+  static const VectorCode best = bestCode();
+  return best;
 }
 
 }  // namespace
 
 void markBytes(const char* bytes, size_t count, ByteMarks* marks) {
-  static const Marking best = bestMarking();
-  best(bytes, count, marks);
+  vectorCode().mark(bytes, count, marks);
+}
+
+Widened widenSome(std::string_view bytes, char16_t* units) {
+  return vectorCode().widen(bytes, units);
 }
 
 }  // namespace xquery

@@ -6,19 +6,29 @@
 #include "Platform/Tree/Names.h"
 
 #include <algorithm>
+#include <cstring>
 #include <limits>
 
 namespace xquery {
 
 namespace {
 
-// Longer texts are stored as they are widened, in two passes over them.
+// Of a longer text it is counted first what it comes to.
 constexpr size_t longestWidened = size_t{1} << 16;
 constexpr const char* notText = "a text is not well formed";
 
 void checkLength(size_t count) {
   constexpr size_t most = std::numeric_limits<uint32_t>::max() - 1;
   if (count > most) throw LibXMLStop{"a text is too long"};
+}
+
+// As much of a long text as is widened at once: whole characters, if they are any.
+std::string_view firstPart(std::string_view text) {
+  if (text.size() <= longestWidened) return text;
+  constexpr size_t longestCharacter = 4;
+  size_t end = longestWidened;
+  while (end > longestWidened - longestCharacter && (text[end] & 0xC0) == 0x80) --end;
+  return text.substr(0, end);
 }
 
 }  // namespace
@@ -55,11 +65,18 @@ NSStringView ReadTree::widened(std::string_view text) {
 
 const NSStringView* ReadTree::storedAlone(std::string_view text) {
   const size_t count = countXMLUnits(text);
-  if (count == notXMLText) throw LibXMLStop{notText};
   checkLength(count);
   char16_t* const units = _builder.roomForUnits(count);
-  widenXML(text, units);
-  return _builder.storeFilled({units, static_cast<uint32_t>(count)});
+  size_t filled = 0;
+  while (!text.empty()) {
+    const std::string_view part = firstPart(text);
+    const NSStringView some = widened(part);
+    if (some.length() > count - filled) throw LibXMLStop{notText};
+    std::memcpy(units + filled, some.wideUnits(), some.length() * sizeof(char16_t));
+    filled += some.length();
+    text.remove_prefix(part.size());
+  }
+  return _builder.storeFilled({units, static_cast<uint32_t>(filled)});
 }
 
 const NSStringView* ReadTree::stored(const ReadText& text) {

@@ -1,6 +1,7 @@
 #include "Platform/Reading/XMLCharacters.h"
 
-#include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/Widening.h"
+#include "Platform/Text/Blocks.h"
 #include "Platform/Text/UTF8.h"
 
 #include <algorithm>
@@ -71,42 +72,28 @@ XMLNameShape shapeOfXMLName(std::string_view bytes) {
   return shape;
 }
 
-namespace {
-
-// Calls `take` with each code point; answers whether all are characters.
-template <class Take>
-bool decode(std::string_view bytes, Take take) {
-  const auto* at = reinterpret_cast<const unsigned char*>(bytes.data());
-  const unsigned char* const end = at + bytes.size();
-  WorkPacer pacer;
-  while (at < end) {
-    pacer.turn();
-    const char32_t point = readUTF8(at, end);
-    // What is no UTF-8 is above all others.
-    if (point >= 0xFFFE && (point <= 0xFFFF || point == invalidCodePoint)) return false;
-    take(point);
-  }
-  return true;
-}
-
-}  // namespace
-
 char16_t* widenXML(std::string_view bytes, char16_t* units) {
-  const bool isText = decode(bytes, [&units](char32_t point) {
-    if (point < 0x10000) {
-      *units++ = static_cast<char16_t>(point);
-    } else {
-      *units++ = static_cast<char16_t>(0xD7C0 + (point >> 10));
-      *units++ = static_cast<char16_t>(0xDC00 + (point & 0x3FF));
-    }
-  });
-  return isText ? units : nullptr;
+  while (!bytes.empty()) {
+    const Widened some = widenSome(bytes, units);
+    if (!some.bytes) return nullptr;
+    bytes.remove_prefix(some.bytes);
+    units += some.units;
+    checkUnits(static_cast<uint32_t>(some.bytes));
+  }
+  return units;
 }
 
 size_t countXMLUnits(std::string_view bytes) {
   size_t count = 0;
-  const bool isText = decode(bytes, [&count](char32_t point) { count += point < 0x10000 ? 1 : 2; });
-  return isText ? count : notXMLText;
+  inBlocks(bytes, [&count](std::string_view block) {
+    uint32_t units = 0;
+    for (const char byte : block) {
+      const auto unsignedByte = static_cast<unsigned char>(byte);
+      units += static_cast<uint32_t>((unsignedByte & 0xC0U) != 0x80) + (unsignedByte >= 0xF0);
+    }
+    count += units;
+  });
+  return count;
 }
 
 }  // namespace xquery

@@ -29,8 +29,7 @@ XMLNameShape shapeOfXMLName(std::string_view bytes);
 // character of XML. There must be room for a unit for each byte. Control characters are let pass.
 char16_t* widenXML(std::string_view bytes, char16_t* units);
 
-constexpr size_t notXMLText = SIZE_MAX;
-// How many units that makes, for a text for which there is no such room; or notXMLText.
+// How many units that makes of a text that is well formed.
 size_t countXMLUnits(std::string_view bytes);
 
 }  // namespace xquery

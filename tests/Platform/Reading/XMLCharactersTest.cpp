@@ -129,7 +129,6 @@ TEST(XMLCharacters, WhatIsNoTextIsNotWidened) {
   for (const std::string_view row : rows) {
     for (const std::string& text : {std::string(row), "ab" + std::string(row) + "cd"}) {
       EXPECT_EQ(widened(text), u"none") << text;
-      EXPECT_EQ(countXMLUnits(text), notXMLText) << text;
     }
   }
 }
