@@ -108,7 +108,24 @@ ReadName* ReadNames::find(const char* begin, const char* end, const char* textEn
   ReadName* const found = _names.find(hash, [&](const ReadName& name) {
     return head == name.head && name.bytes.size() == length && isRest(name, begin);
   });
-  return found ? found : add(bytes, hash, head.words);
+  _last->follower = found ? found : add(bytes, hash, head.words);
+  return _last = _last->follower;
+}
+
+namespace {
+
+// Of the bytes that may stand behind a name in a tag.
+bool endsName(char byte) {
+  return isXMLSpace(byte) || byte == '=' || byte == '>' || byte == '/';
+}
+
+}  // namespace
+
+ReadName* ReadNames::likely(const char* begin, const char* textEnd) {
+  ReadName* const name = _last->follower;
+  if (!name || static_cast<size_t>(textEnd - begin) <= name->bytes.size()) return nullptr;
+  if (!endsName(begin[name->bytes.size()]) || !isAt(*name, begin, textEnd)) return nullptr;
+  return _last = name;
 }
 
 bool ReadNames::isAt(const ReadName& name, const char* place, const char* textEnd) {

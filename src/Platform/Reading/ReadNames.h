@@ -45,6 +45,7 @@ struct ReadName {
   ReadPrefix* declares = nullptr;  // as an attribute
   Interned element;                // as what it was interned last
   Interned attribute;
+  ReadName* follower = nullptr;  // in a tag, the last time
 };
 
 class ReadNames {
@@ -56,6 +57,8 @@ class ReadNames {
   //
   // The entry of the name between the two places; nothing at `textEnd` is read.
   ReadName* find(const char* begin, const char* end, const char* textEnd);
+  // The same without knowing where it ends, for what is likely to stand there; null for: find it.
+  ReadName* likely(const char* begin, const char* textEnd);
   // Whether the name stands at the place, in such a text.
   static bool isAt(const ReadName& name, const char* place, const char* textEnd);
   const NSXMLName* elementName(ReadName& name);
@@ -101,6 +104,8 @@ class ReadNames {
   EntryTable<Resolved> _resolved;
   std::vector<Binding, ValueAllocator<Binding>> _bindings;
   uint64_t _tag = 0;
+  ReadName _none;
+  ReadName* _last = &_none;  // that was found
   ReadPrefix* const _noPrefix;
 };
 

@@ -67,7 +67,7 @@ class XMLReader {
   bool isFollowedBySection(const char* at) const;
   void addText(const Raw& text, bool isWhole);
 
-  const char* readName(const char* at);
+  ReadName* readName(const char*& at);
   const char* readStartTag(const char* at);
   const char* readAttribute(const char* at);
   const char* readEquals(const char* at) const;
@@ -240,19 +240,23 @@ const char* XMLReader::skipSpace(const char* at) const {
   return at;
 }
 
-const char* XMLReader::readName(const char* at) {
+// Moves behind the name; null where the text in hand ends before it may.
+ReadName* XMLReader::readName(const char*& at) {
+  if (ReadName* const name = _names.likely(at, _end)) [[likely]] {
+    at += name->bytes.size();
+    return name;
+  }
   uint64_t wide = 0;
-  const char* const end = _text.nameEnd(at, wide);
-  take(!(wide && _isASCII) && static_cast<size_t>(end - at) <= longestNameTaken);
-  return end == _end ? nullptr : end;
+  const char* const begin = at;
+  at = _text.nameEnd(begin, wide);
+  take(!(wide && _isASCII) && static_cast<size_t>(at - begin) <= longestNameTaken);
+  return at == _end ? nullptr : _names.find(begin, at, _end);
 }
 
 const char* XMLReader::readStartTag(const char* at) {
   take(!_open.empty() || !_hasRoot);
-  const char* const nameBegin = at + 1;
-  at = readName(nameBegin);
-  if (!at) return nullptr;
-  ReadName* const name = _names.find(nameBegin, at, _end);
+  ReadName* const name = readName(++at);
+  if (!name) return nullptr;
   _attributes.clear();
   _declares = false;
   for (;;) {
@@ -284,10 +288,9 @@ const char* XMLReader::readEquals(const char* at) const {
 }
 
 const char* XMLReader::readAttribute(const char* at) {
-  const char* const nameEnd = readName(at);
-  if (!nameEnd) return nullptr;
-  Attribute attribute = {_names.find(at, nameEnd, _end), {}, {}};
-  at = readEquals(nameEnd);
+  Attribute attribute = {readName(at), {}, {}};
+  if (!attribute.name) return nullptr;
+  at = readEquals(at);
   if (!at) return nullptr;
   take(*at == '"' || *at == '\'');
   at = readValue(at + 1, *at, attribute.value);

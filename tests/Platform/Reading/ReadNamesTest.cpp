@@ -73,6 +73,32 @@ TEST_F(ReadNamesTest, ANameIsFoundAtItsPlace) {
   }
 }
 
+TEST_F(ReadNamesTest, WhatFollowedANameIsLikelyToFollowItAgain) {
+  const auto likely = [this](std::string_view place) {
+    const std::unique_ptr<char[]> bytes(new char[place.size()]);
+    std::memcpy(bytes.get(), place.data(), place.size());
+    return names.likely(bytes.get(), bytes.get() + place.size());
+  };
+  EXPECT_EQ(likely("a>"), nullptr);
+  for (const std::string& text : {std::string("b"), std::string(15, 'x'), std::string(40, 'x')}) {
+    named("a");
+    ReadName& name = named(text);
+    for (const char* end : {">", " ", "=", "/", "\n", "\t", "\r", "> and something else"}) {
+      named("a");
+      EXPECT_EQ(likely(text + end), &name) << text << end;
+    }
+    for (const char* end : {"", "x>", "x", "\"", "<", ":y>"}) {
+      named("a");
+      EXPECT_EQ(likely(text + end), nullptr) << text << end;
+      named(text);
+    }
+    named("a");
+    EXPECT_EQ(likely(text.substr(1)), nullptr);
+    EXPECT_EQ(likely("y" + text.substr(1) + ">"), nullptr);
+    named(text);
+  }
+}
+
 TEST_F(ReadNamesTest, WhatIsNoNameIsNotTaken) {
   for (const char* text : {"1", "a:", ":a", "a:b:c", "a\"", "\xC3", "a&b"}) {
     EXPECT_THROW(named(text), NotTaken) << text;
