@@ -19,8 +19,7 @@ namespace xquery {
 namespace {
 
 constexpr size_t pageBytes = 4096;
-// Becomes usable at once.
-constexpr size_t stepBytes = size_t{2} << 20;
+constexpr size_t largePageBytes = size_t{2} << 20;
 // What a small process uses comes in small pages.
 constexpr size_t smallPagesBytes = size_t{4} << 20;
 
@@ -120,7 +119,7 @@ bool RangeRuns::makeUsable(char* end) {
   if (end <= _usableEnd) return true;
   if (end > rangeEnd) return false;
   char* const before = _usableEnd;
-  for (const size_t step : {stepBytes, pageBytes}) {
+  for (const size_t step : {largePageBytes, pageBytes}) {
     char* const wanted = std::min(roundedUp(end, step), rangeEnd);
     const auto bytes = static_cast<size_t>(wanted - before);
     if (::mprotect(before, bytes, PROT_READ | PROT_WRITE) != 0) continue;
@@ -311,7 +310,7 @@ RangeRuns::Block* RangeRuns::split(Run* run, size_t units) {
 
 // --- giving back -----------------------------------------------------------------------------
 
-void RangeRuns::release(Run* run) {
+RangeRuns::FreeRoom RangeRuns::release(Run* run) {
   forbid(run->block(), bytesOf(run->units()));
   if (Run* const after = run->after(); after->address() != _top && after->isFree()) {
     unlink(static_cast<FreeRun*>(after));
@@ -328,10 +327,21 @@ void RangeRuns::release(Run* run) {
   if (run->after()->address() == _top) {
     _top = run->address();
     _unitsBeforeTop = run->unitsBefore;
-    return;
+    return {_top, _usableEnd};
   }
   run->after()->unitsBefore = static_cast<uint32_t>(run->units());
   link(run);
+  return {run->address(), run->after()->address()};
+}
+
+void RangeRuns::releaseToSystem(Run* run) {
+  char* const begin = run->address();
+  char* const end = run->after()->address();
+  const FreeRoom room = release(run);
+  char* const from = std::max(roundedDown(begin, largePageBytes),
+                              roundedUp(room.begin + sizeof(FreeRun), largePageBytes));
+  char* const to = std::min(roundedUp(end, largePageBytes), roundedDown(room.end, largePageBytes));
+  giveBack(from, to);
 }
 
 void RangeRuns::releaseIdle() {
@@ -349,14 +359,12 @@ void RangeRuns::keep(Run* run) {
          (_keptCount - leaving == _kept.size() || _keptBytes + bytes > mostKeptBytes)) {
     Run* const oldest = _kept[leaving++];
     _keptBytes -= oldest->units() * unit;
-    giveBack(oldest->address() + sizeof(FreeRun), oldest->after()->address());
-    release(oldest);
+    releaseToSystem(oldest);
   }
   std::move(_kept.data() + leaving, _kept.data() + _keptCount, _kept.data());
   _keptCount -= leaving;
   if (bytes > mostKeptBytes) {
-    giveBack(run->address() + sizeof(FreeRun), run->after()->address());
-    release(run);
+    releaseToSystem(run);
     return;
   }
   _kept[_keptCount++] = run;

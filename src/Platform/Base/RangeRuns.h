@@ -114,7 +114,13 @@ class RangeRuns {
   Block* split(Run* run, size_t units);
   void give(Run* run);
   void keep(Run* run);
-  void release(Run* run);
+  // All that is free around a run that was released.
+  struct FreeRoom {
+    char* begin;
+    char* end;
+  };
+  FreeRoom release(Run* run);
+  void releaseToSystem(Run* run);
   void releaseIdle();
   void giveBack(char* begin, char* end);
 

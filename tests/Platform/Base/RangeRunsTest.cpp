@@ -170,6 +170,22 @@ TEST(RangeRuns, LargeBlocksGoBackToTheSystemAndOthersOnRequest) {
   }
 }
 
+// What shares a large page with something that is in use stays, so that the page remains one.
+TEST(RangeRuns, LargePagesGoBackAsAWhole) {
+  RangeRuns runs(256 * mebibyte);
+  std::vector<void*> blocks;
+  for (int count = 0; count < 100; ++count) {
+    blocks.push_back(runs.take(mebibyte));
+    std::memset(blocks.back(), 1, mebibyte);
+  }
+  auto* const used = static_cast<char*>(runs.take(100));
+  void* const larger = runs.take(60 * mebibyte);
+  for (void* const block : blocks) runs.give(block);
+  runs.give(larger);  // whose room is that of what is kept
+  EXPECT_FALSE(isInMemory(static_cast<char*>(blocks[50])));
+  EXPECT_TRUE(isInMemory(used - reinterpret_cast<uintptr_t>(used) % (2 * mebibyte)));
+}
+
 TEST(RangeRuns, ThreadsMayTakeAndGiveAtOnce) {
   RangeRuns runs(64 * mebibyte);
   const auto work = [&runs](uint32_t seed) {
