@@ -62,6 +62,11 @@ constexpr auto shortPaths = std::to_array<const char*>({
     "../@id",
     "c/d/text()",
     "$x/ancestor-or-self::node()",
+    "$x/following-sibling::b",
+    "$x/preceding-sibling::node()",
+    "$x/preceding-sibling::b/@id",
+    "$x/preceding-sibling::node()/d/text()",
+    "$x/following-sibling::c/e/d",
 });
 
 TEST(ShortPaths, AreTakenWhateverTheyStartFrom) {
@@ -84,7 +89,9 @@ TEST(ShortPaths, AreNoPathsThatHaveToBeSortedOrLookedAtTwice) {
                            "/a/b",
                            "$x/self::a",
                            "$x/a/b/c/d/e/f/g/h/i",
-                           "$x/following-sibling::b",
+                           "$x/b/following-sibling::b",
+                           "../following-sibling::b",
+                           "$x/following::b",
                            "$x/b/string(.)",
                            "$x/p:*",
                            "f($x)/b",
@@ -106,6 +113,7 @@ TEST(ShortPaths, AreNoPathsThatHaveToBeSortedOrLookedAtTwice) {
 TEST(ShortPaths, AreCounted) {
   for (const std::string path :
        {"b", "@id", "c/d", "..", "../b", "ancestor::c", "ancestor-or-self::node()",
+        "preceding-sibling::c", "following-sibling::node()", "$x/preceding-sibling::node()/d",
         "ancestor::a/@id", "ancestor::node()/b", "ancestor::c/d/text()", "$x/ancestor::a/c"}) {
     for (const std::string question :
          {"count(#)", "exists(#)", "not(#)", "count(#) > 1", "if (#) then 1 else 2"}) {

@@ -60,7 +60,7 @@ bool XQueryShortWalk::readStep(const XQueryAxisStep& step) {
   const bool isLeading = _count == 0 || _steps[_count - 1].axis == XQueryAxisParent;
   const bool isOpen = step.axis() == XQueryAxisChild || step.axis() == XQueryAxisAttribute ||
                       (step.axis() == XQueryAxisParent && isLeading) ||
-                      (goesUp(step.axis()) && _count == 0);
+                      ((goesUp(step.axis()) || goesAside(step.axis())) && _count == 0);
   if (!isOpen) return false;
   const NSXMLExpandedName* name = nullptr;
   uint32_t kinds = 0;

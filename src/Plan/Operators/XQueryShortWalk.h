@@ -1,11 +1,11 @@
 // The walk of a short path: from one node over children and attributes of given names, and of these
-// all there are, or over its ancestors first.
+// all there are, or over its ancestors or siblings first.
 //
 // What such a path finds from one node comes in document order, each node once: the children of a
-// node stand in their order, the subtrees of two children do not meet, and attributes have no
-// children. So there is nothing to sort and nothing to look for twice. Ancestors come the nearest
-// first, as a path answers them; what is found from several of them comes once, but in another
-// order than that of the path.
+// node stand in their order, the subtrees of two siblings do not meet, and attributes have no
+// children. So there is nothing to sort and nothing to look for twice. Ancestors and preceding
+// siblings come the nearest first, as a path answers them; what is found from several ancestors
+// comes once, but in another order than that of the path.
 #pragma once
 
 #include "Context/XQueryContextInternal.h"
@@ -84,6 +84,17 @@ class XQueryShortWalk {
   static bool goesUp(int axis) {
     return axis == XQueryAxisAncestor || axis == XQueryAxisAncestorOrSelf;
   }
+  static bool goesAside(int axis) {
+    return axis == XQueryAxisFollowingSibling || axis == XQueryAxisPrecedingSibling;
+  }
+  // What is found from preceding siblings comes in document order where these do.
+  template <class Take>
+  static void walkPrecedingSiblings(NSXMLNode* node, bool isLast, Take& take) {
+    if (isLast) return XQueryWalkPrecedingSiblings(node, take);
+    if (!node->previousSibling()) return;
+    const auto takeBefore = [&](NSXMLNode* found) { return found != node && take(found); };
+    XQueryWalkSiblings(node->parent()->firstChild(), takeBefore);
+  }
 
   // False to end the walk.
   template <class Visit>
@@ -101,6 +112,10 @@ class XQueryShortWalk {
       XQueryWalkAttributes(node, take);
     } else if (goesUp(step.axis)) {
       XQueryWalkAncestors(step.axis == XQueryAxisAncestor ? node->parent() : node, take);
+    } else if (step.axis == XQueryAxisFollowingSibling) {
+      XQueryWalkSiblings(node->nextSibling(), take);
+    } else if (step.axis == XQueryAxisPrecedingSibling) {
+      walkPrecedingSiblings(node, index + 1 == _count, take);
     } else if (node->parent()) {
       take(node->parent());
     }

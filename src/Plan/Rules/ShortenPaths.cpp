@@ -1,4 +1,4 @@
-// A path over a few children and attributes.
+// A path over a few children, attributes and siblings.
 //
 // Pattern     "$p/name", "@id", "../price/text()": up to eight steps to parents, which come first,
 //             to children and to attributes, by names or by text() and node(), without predicates,
