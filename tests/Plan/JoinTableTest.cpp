@@ -12,6 +12,7 @@ namespace xquery {
 namespace {
 
 using functiontest::boolean;
+using functiontest::decimal;
 using functiontest::empty;
 using functiontest::integer;
 using functiontest::nan;
@@ -85,24 +86,28 @@ TEST(JoinTable, AnItemOfManyKeysIsSelectedOnce) {
 TEST(JoinTable, ManyProbesFindTheSameByTheOrderOfTheKeys) {
   std::vector<Value> texts;
   std::vector<Value> numbers;
+  std::vector<Value> decimals;
   for (int i = 0; i < 200; ++i) {
     const int value = i * 37 % 100;
     texts.push_back(untyped(std::to_string(value)));
     numbers.push_back(i % 9 == 4 ? nan() : number(value));
+    decimals.push_back(decimal(std::to_string(value) + (i % 3 ? ".1" : "")));
   }
   for (const auto test : {less, XQueryRelation::Greater}) {
     for (const bool negated : {false, true}) {
-      for (const auto* keys : {&texts, &numbers}) {
+      for (const auto* keys : {&texts, &numbers, &decimals}) {
         XQueryJoinTable table = tableOf(condition(test, negated), *keys);
-        for (int probe = -1; probe <= 100; ++probe) {
+        for (int each = -1; each <= 100; ++each) {
+          const Value probe =
+              keys == &decimals ? decimal(std::to_string(each) + ".1") : number(each);
           XQueryJoinTable::Selection selection;
           XQueryJoinTable::Selection fresh;
           XQueryJoinTable other = tableOf(condition(test, negated), *keys);
-          ASSERT_TRUE(select(table, number(probe), selection));
-          ASSERT_TRUE(select(other, number(probe), fresh));
-          EXPECT_EQ(selection, fresh) << test << negated << probe;
-          EXPECT_EQ(table.numberFor(*table.questionOf(number(probe))), fresh.size());
-          EXPECT_EQ(table.meets(number(probe)), !fresh.empty());
+          ASSERT_TRUE(select(table, probe, selection));
+          ASSERT_TRUE(select(other, probe, fresh));
+          EXPECT_EQ(selection, fresh) << test << negated << each;
+          EXPECT_EQ(table.numberFor(*table.questionOf(probe)), fresh.size());
+          EXPECT_EQ(table.meets(probe), !fresh.empty());
         }
       }
     }
@@ -125,8 +130,10 @@ TEST(JoinTable, CountsItemsThatNeedNotBeAsked) {
   EXPECT_EQ(numberOf(condition(equal), two, string("b")), std::nullopt);
   EXPECT_EQ(numberOf(condition(equal), {untyped("1"), untyped("x")}, number(1)), std::nullopt);
   EXPECT_EQ(numberOf(condition(equal), {number(1), boolean(true)}, number(1)), std::nullopt);
-  EXPECT_EQ(numberOf(condition(less), {integer(9007199254740993)}, integer(9007199254740992)),
-            std::nullopt);
+  EXPECT_EQ(numberOf(condition(less), {integer(9007199254740993)}, integer(9007199254740992)), 0U);
+  EXPECT_EQ(
+      numberOf(condition(less), {integer(9007199254740993), number(1)}, integer(9007199254740992)),
+      std::nullopt);
 }
 
 // As pairs they would fill gigabytes.
@@ -170,14 +177,34 @@ TEST(JoinTable, NaNMeetsNothing) {
 }
 
 // Decimals that are one double may differ.
-TEST(JoinTable, DecimalsThatAreNoDoublesAreAskedWhereTheDoublesAreEqual) {
-  const std::vector<Value> keys = {integer(9007199254740993), integer(1)};
+TEST(JoinTable, DecimalsAreToldApartByTheirDigits) {
+  const std::vector<Value> keys = {integer(9007199254740993), integer(1), decimal("0.1"),
+                                   decimal("0.10000000000000000001"), integer(9007199254740992)};
+  EXPECT_EQ(selected(condition(equal), keys, integer(1)), "1");
+  EXPECT_EQ(selected(condition(equal), keys, number(1)), "1");
+  EXPECT_EQ(selected(condition(equal), keys, number(0.1)), "2 3");
+  EXPECT_EQ(selected(condition(equal), keys, decimal("0.10")), "2");
+  EXPECT_EQ(selected(condition(equal), keys, integer(9007199254740993)), "0");
+  EXPECT_EQ(selected(condition(less), keys, integer(9007199254740993)), "1 2 3 4");
+  EXPECT_EQ(selected(condition(less), keys, decimal("0.10000000000000000001")), "2");
+  EXPECT_EQ(selected(condition(less, true), keys, integer(9007199254740993)), "0");
+  EXPECT_EQ(selected(condition(less), keys, sequence({decimal("0.1"), integer(2)})), "1 2 3");
+  EXPECT_EQ(selected(condition(equal), {integer(1)}, integer(9007199254740993)), "");
+  XQueryJoinTable table = tableOf(condition(equal), keys);
+  EXPECT_EQ(table.meets(integer(9007199254740992)), true);
+  EXPECT_EQ(table.meets(integer(9007199254740991)), false);
+}
+
+TEST(JoinTable, DecimalsAmongDoublesAreAskedWhereTheDoublesAreEqual) {
+  const std::vector<Value> keys = {integer(9007199254740993), integer(1), number(5)};
   EXPECT_EQ(selected(condition(equal), keys, integer(1)), "1?");
   EXPECT_EQ(selected(condition(equal), keys, number(1)), "1");
-  EXPECT_EQ(selected(condition(equal), {integer(1)}, integer(9007199254740993)), "");
-  EXPECT_EQ(selected(condition(less), keys, integer(9007199254740992)), "0? 1");
-  EXPECT_EQ(selected(condition(less), keys, integer(9007199254740999)), "0 1");
+  EXPECT_EQ(selected(condition(less), keys, integer(9007199254740992)), "0? 1 2");
+  EXPECT_EQ(selected(condition(less), keys, integer(9007199254740999)), "0 1 2");
   EXPECT_EQ(selected(condition(less, true), keys, integer(9007199254740992)), "0?");
+  EXPECT_EQ(selected(condition(less), {decimal("0.1"), integer(1)},
+                     sequence({decimal("0.5"), untyped("0.1")})),
+            "0");
   XQueryJoinTable table = tableOf(condition(equal), keys);
   EXPECT_EQ(table.meets(integer(9007199254740992)), std::nullopt);
   EXPECT_EQ(table.meets(integer(7)), false);

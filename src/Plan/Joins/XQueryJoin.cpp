@@ -3,6 +3,7 @@
 #include "Context/KeptValues.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Joins/XQueryJoinPair.h"
 #include "Plan/Operators/XQueryTentative.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
@@ -10,6 +11,7 @@
 #include "xquery/XMLNode.h"
 
 #include <algorithm>
+#include <array>
 #include <utility>
 #include <vector>
 
@@ -55,6 +57,12 @@ bool anyFails(const std::vector<Ref<XQueryExpr>>& exprs, XQueryContext& context)
 
 }  // namespace
 
+// What a table is asked in this round.
+struct XQueryJoin::Asked {
+  XQueryJoinTable* table;
+  XQueryJoinTable::Question question;
+};
+
 // The tables of one list of items, one for each term of the condition. That of the first term is
 // made at once, those of others when it has picked as many items as making them takes.
 class XQueryJoin::Tables final : public XQueryKeptValue {
@@ -86,19 +94,32 @@ class XQueryJoin::Tables final : public XQueryKeptValue {
     return *_isAscending;
   }
 
+  // What finds the items that meet both of two comparisons, if anything does; makes it when so many
+  // items have been asked as that takes. The first of the two is then that of the rows.
+  XQueryJoinPair* pairFor(std::vector<Asked>& asked) {
+    if (asked.size() != 2) return nullptr;
+    if (!XQueryJoinPair::isOfRows(*asked[0].table)) std::swap(asked[0], asked[1]);
+    const Asked& first = asked[0];
+    const Asked& second = asked[1];
+    if (askedOfPicks >= items->size()) {
+      askedOfPicks = 0;
+      _pair = XQueryJoinPair::of(*first.table, first.question, *second.table, second.question);
+      _areOfPair = {first.table, second.table};
+    }
+    const bool isPair = _pair && _areOfPair == std::array{first.table, second.table};
+    return isPair && _pair->answersFor(first.question, second.question) ? _pair.get() : nullptr;
+  }
+
   const XQueryJoinTable::Items items;
   std::vector<std::unique_ptr<XQueryJoinTable>> byTerm;  // null for one that is not there
   size_t next = 0;                                       // the one that is made next
   size_t picked = 0;                                     // items, since the last one was made
+  size_t askedOfPicks = 0;  // how many items that one table picked another one was asked of
 
  private:
   std::optional<bool> _isAscending;  // none before it is asked
-};
-
-// What a table is asked in this round.
-struct XQueryJoin::Asked {
-  XQueryJoinTable* table;
-  XQueryJoinTable::Question question;
+  std::unique_ptr<XQueryJoinPair> _pair;
+  std::array<XQueryJoinTable*, 2> _areOfPair{};
 };
 
 std::unique_ptr<const XQueryJoin> XQueryJoin::ofClause(const XQueryExpr& owner, int64_t varID,
@@ -135,7 +156,7 @@ bool XQueryJoin::pick(const Value& source, const Lister& listItems, XQueryContex
   const bool areSure = areAll && _condition.isWhole;
   picks.items = found->items;
   if (areSure) picks.number = numberOf(*found, asked, picks.wantedNumber);
-  if (!picks.number) select(asked, areSure, picks);
+  if (!picks.number) select(*found, asked, areSure, picks);
   found->picked += picks.number.value_or(picks.chosen.size());
   if (!areAll && !found->areAllTried() && found->picked >= found->items->size()) {
     addTable(*found, context);
@@ -170,6 +191,10 @@ std::shared_ptr<XQueryJoin::Tables> XQueryJoin::makeTables(const Lister& listIte
   if (items->size() < XQueryJoinTable::fewestItems || items->size() > XQueryJoinTable::mostItems) {
     return nullptr;
   }
+  // Of one of them alone somebody may have to know.
+  const bool holdErrors = std::any_of(items->begin(), items->end(),
+                                      [](const Value& item) { return isa<XQueryError>(item); });
+  if (holdErrors) return nullptr;
   if (_condition.looksOutOfItems && !XQueryAreSettled(*items, true)) return nullptr;
   auto made = std::make_shared<Tables>(std::move(items), _condition.terms.size());
   return addTable(*made, context) ? made : nullptr;
@@ -259,27 +284,34 @@ bool XQueryJoin::askEach(const Tables& tables, bool withProbes, XQueryContext& c
   return !asked.empty();
 }
 
-// How many items a single table picks, if that can be told without a list of them.
-std::optional<uint64_t> XQueryJoin::numberOf(Tables& tables, const std::vector<Asked>& asked,
+// How many items a table or a pair picks, if that can be told without a list of them.
+std::optional<uint64_t> XQueryJoin::numberOf(Tables& tables, std::vector<Asked>& asked,
                                              XQueryPicks::Number wanted) {
   using Number = XQueryPicks::Number;
-  if (wanted == Number::Unwanted || asked.size() != 1) return std::nullopt;
+  if (wanted == Number::Unwanted || asked.size() > 2) return std::nullopt;
   if (wanted == Number::OfNodes && !tables.holdsEachNodeOnce()) return std::nullopt;
-  return asked.front().table->numberFor(asked.front().question);
+  if (asked.size() == 1) return asked.front().table->numberFor(asked.front().question);
+  XQueryJoinPair* pair = tables.pairFor(asked);
+  return pair ? std::optional(pair->numberFor(asked[0].question, asked[1].question)) : std::nullopt;
 }
 
 // The table that the fewest items meet picks, and the others are asked of these.
-void XQueryJoin::select(std::vector<Asked>& asked, bool areSure, XQueryPicks& picks) {
+void XQueryJoin::select(Tables& tables, std::vector<Asked>& asked, bool areSure,
+                        XQueryPicks& picks) {
+  const bool wantsFirst = picks.wantsFirst && areSure;
+  if (XQueryJoinPair* pair = tables.pairFor(asked)) {
+    return pair->select(asked[0].question, asked[1].question, areSure, wantsFirst, picks.chosen);
+  }
   const auto isFewer = [](Asked& a, Asked& b) {
     return a.table->estimateFor(a.question) < b.table->estimateFor(b.question);
   };
   if (asked.size() > 1) {
     std::iter_swap(asked.begin(), std::min_element(asked.begin(), asked.end(), isFewer));
   }
-  const bool wantsFirst = picks.wantsFirst && areSure;
   asked.front().table->select(asked.front().question, picks.chosen,
                               wantsFirst && asked.size() == 1);
   if (asked.size() == 1 && areSure) return;
+  if (asked.size() > 1) tables.askedOfPicks += picks.chosen.size();
   WorkPacer pacer;
   size_t count = 0;
   for (const XQueryPick& pick : picks.chosen) {

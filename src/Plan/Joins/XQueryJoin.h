@@ -55,9 +55,9 @@ class XQueryJoin final : public XQueryPicker {
   Value keyOf(const Value& item, size_t position, size_t term, XQueryContext& context) const;
   bool askEach(const Tables& tables, bool withProbes, XQueryContext& context,
                std::vector<Asked>& asked) const;
-  static std::optional<uint64_t> numberOf(Tables& tables, const std::vector<Asked>& asked,
+  static std::optional<uint64_t> numberOf(Tables& tables, std::vector<Asked>& asked,
                                           XQueryPicks::Number wanted);
-  static void select(std::vector<Asked>& asked, bool areSure, XQueryPicks& picks);
+  static void select(Tables& tables, std::vector<Asked>& asked, bool areSure, XQueryPicks& picks);
 
   const XQueryExpr& _owner;
   const int64_t _varID;  // 0: the item is the context item

@@ -3,6 +3,7 @@
 #include "Expr/Clauses/XQueryQuantified.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryPath.h"
+#include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Functions/Boolean.h"
 #include "Functions/Sequence.h"
@@ -234,9 +235,14 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfSome(XQueryPlaceID pl
   own.addDeeds(facts(bound));
   own.assigns.add(clause.varID());
   (ofKey ? found.relation.keysAreOfEach : found.relation.probesAreOfEach) = true;
-  expr = XQueryJoinKeys::exprWithClauses(
-      {{clause.varID(), _planning.exprAt(bound), true, facts(clausePlace)}}, expr,
-      found.relation.isValueComparison);
+  const auto* itself = dyn_cast<XQueryVariable>(XQueryWithoutParentheses(expr.get()));
+  if (itself && itself->varID() == clause.varID()) {
+    expr = _planning.exprAt(bound);
+  } else {
+    expr = XQueryJoinKeys::exprWithClauses(
+        {{clause.varID(), _planning.exprAt(bound), true, facts(clausePlace)}}, expr,
+        found.relation.isValueComparison);
+  }
   return found;
 }
 

@@ -1,7 +1,6 @@
 #include "Plan/Joins/XQueryJoinTable.h"
 
 #include "Expr/XQuerySequence.h"
-#include "Platform/Base/KeyedHash.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryTypeTable.h"
@@ -21,45 +20,6 @@ namespace {
 
 constexpr double notANumber = std::numeric_limits<double>::quiet_NaN();
 
-uint32_t hashOf(double value) {
-  // The two zeros are equal.
-  return static_cast<uint32_t>(keyedHash(std::bit_cast<uint64_t>(value == 0 ? 0.0 : value)));
-}
-uint32_t hashOf(NSStringView text) {
-  return text.hash();
-}
-uint32_t hashOf(const NSObject* node) {
-  return static_cast<uint32_t>((reinterpret_cast<uintptr_t>(node) * 0x9E3779B97F4A7C15U) >> 32U);
-}
-
-int orderOf(double a, double b) {
-  return a < b ? -1 : a > b ? 1 : 0;
-}
-int orderOf(NSStringView a, NSStringView b) {
-  return a.compare(b);
-}
-bool isEqual(double a, double b) {
-  return a == b;
-}
-bool isEqual(NSStringView a, NSStringView b) {
-  return a.equals(b);
-}
-int orderOf(const NSObject* a, const NSObject* b) {
-  return std::less<>()(a, b) ? -1 : std::less<>()(b, a) ? 1 : 0;
-}
-bool isEqual(const NSObject* a, const NSObject* b) {
-  return a == b;
-}
-bool meetsNothing(double key) {
-  return std::isnan(key);
-}
-bool meetsNothing(NSStringView) {
-  return false;
-}
-bool meetsNothing(const NSObject*) {
-  return false;
-}
-
 // What holds for an order relation, and for equal values.
 XQueryRelation withTies(XQueryRelation relation) {
   if (relation.negated) return relation;
@@ -70,7 +30,7 @@ XQueryRelation withTies(XQueryRelation relation) {
 // Of several probes of an order relation one decides: what is below any is below the greatest.
 template <class Key>
 Key decidingProbe(XQueryRelation relation, const std::vector<Key>& probes) {
-  const auto below = [](const Key& a, const Key& b) { return orderOf(a, b) < 0; };
+  const auto below = [](const Key& a, const Key& b) { return XQueryOrderOfKeys(a, b) < 0; };
   const bool wantsGreatest = (relation.test == XQueryRelation::Less) != relation.negated;
   return wantsGreatest ? *std::max_element(probes.begin(), probes.end(), below)
                        : *std::min_element(probes.begin(), probes.end(), below);
@@ -83,9 +43,9 @@ void keepDistinct(std::vector<Key>& probes) {
   WorkPacer pacer;
   std::sort(probes.begin(), probes.end(), [&pacer](const Key& a, const Key& b) {
     pacer.turn();
-    return orderOf(a, b) < 0;
+    return XQueryOrderOfKeys(a, b) < 0;
   });
-  const auto areEqual = [](const Key& a, const Key& b) { return isEqual(a, b); };
+  const auto areEqual = [](const Key& a, const Key& b) { return XQueryAreEqualKeys(a, b); };
   probes.erase(std::unique(probes.begin(), probes.end(), areEqual), probes.end());
 }
 
@@ -110,28 +70,6 @@ void arrange(XQueryJoinTable::Selection& selection) {
 
 }  // namespace
 
-template <class Key>
-void XQueryJoinTable::Buckets::build(const std::vector<Key>& keys) {
-  const size_t buckets = std::bit_ceil(2 * keys.size() + 1);
-  _starts.assign(buckets + 1, 0);
-  _keys.resize(keys.size());
-  std::vector<uint32_t> bucketOf(keys.size());
-  WorkPacer pacer;
-  for (size_t key = 0; key < keys.size(); ++key) {
-    pacer.turn();
-    bucketOf[key] = static_cast<uint32_t>(hashOf(keys[key]) & (buckets - 1));
-    ++_starts[bucketOf[key] + 1];
-  }
-  std::partial_sum(_starts.begin(), _starts.end(), _starts.begin());
-  // From the last key on: where a bucket ends goes back to where it starts.
-  for (size_t key = keys.size(); key-- > 0;) {
-    pacer.turn();
-    _keys[--_starts[bucketOf[key] + 1]] = static_cast<uint32_t>(key);
-  }
-  _starts.erase(_starts.begin());
-  _starts.push_back(static_cast<uint32_t>(keys.size()));
-}
-
 // --- filling -------------------------------------------------------------------------------------
 
 XQueryJoinTable::XQueryJoinTable(const XQueryJoinRelation& by, Items items, const KeyReader& keyOf)
@@ -153,6 +91,8 @@ XQueryJoinTable::~XQueryJoinTable() {
 
 void XQueryJoinTable::readKeys(const KeyReader& keyOf) {
   const int64_t bytesBefore = workMeter.valueBytes;
+  if (!_isIdentity) _keys.reserve(_items->size());
+  _positions.reserve(_items->size());
   for (size_t index = 0; index < _items->size() && _isComplete; ++index) {
     checkWork();
     read(static_cast<uint32_t>(index), keyOf(index));
@@ -180,16 +120,20 @@ void XQueryJoinTable::read(uint32_t position, const Value& value) {
     if (!readNode(position, list)) _irregular.push_back(position);
     return;
   }
-  Operands keys;
-  for (size_t i = 0; i < list.count(); ++i) keys.emplace_back(list[i]);
-  if (!takes(keys)) return _irregular.push_back(position);
+  const size_t first = _keys.size();
+  if (list.count() > mostItems - first) throw std::bad_alloc();
+  for (size_t i = 0; i < list.count(); ++i) _keys.emplace_back(list[i]);
+  const std::span<const Operand> keys = std::span(_keys).subspan(first);
+  if (!takes(keys)) {
+    _keys.erase(_keys.begin() + static_cast<std::ptrdiff_t>(first), _keys.end());
+    return _irregular.push_back(position);
+  }
   _hasSeveralKeys = _hasSeveralKeys || keys.size() > 1;
   for (size_t i = 0; i < keys.size(); ++i) {
-    if (_keys.size() == mostItems) throw std::bad_alloc();
     if (!list[i]->isNode()) _keptKeys.emplace_back(list[i]);
     _hasDecimals = _hasDecimals || keys[i].isDecimal();
     _hasInexactDecimals = _hasInexactDecimals || keys[i].kind == Operand::InexactDecimal;
-    _keys.push_back(std::move(keys[i]));
+    _hasFloating = _hasFloating || keys[i].kind == Operand::Floating;
     _positions.push_back(position);
   }
 }
@@ -199,14 +143,14 @@ bool XQueryJoinTable::readNode(uint32_t position, const XQueryItemList& keys) {
   if (keys.count() == 0) return true;
   if (keys.count() > 1 || !keys[0]->isNode()) return false;
   _keptKeys.emplace_back(keys[0]);
-  _nodes.push_back(keys[0]);
+  _nodes.keys.push_back(keys[0]);
   _positions.push_back(position);
   return true;
 }
 
 // Whether the keys of an item are of the one kind that the table holds: that of its first key. An
 // item without keys meets nothing.
-bool XQueryJoinTable::takes(const Operands& keys) {
+bool XQueryJoinTable::takes(std::span<const Operand> keys) {
   if (_isComplement && (keys.size() != 1 || keys.front().isNaN())) return false;
   // What is nothing begins as the empty text does.
   if (_isPrefix && (keys.empty() || !keys.front().isText())) return false;
@@ -227,11 +171,11 @@ bool XQueryJoinTable::takes(const Operands& keys) {
 void XQueryJoinTable::scanTexts() {
   if (_isScanned) return;
   _isScanned = true;
-  _numbers.reserve(_keys.size());
+  _numbers.keys.reserve(_keys.size());
   for (size_t key = 0; key < _keys.size(); ++key) {
     bool isNumber = _keys[key].scan();
     if (_isComplement && std::isnan(_keys[key].number)) isNumber = false;
-    _numbers.push_back(isNumber ? _keys[key].number : notANumber);
+    _numbers.keys.push_back(isNumber ? _keys[key].number : notANumber);
     if (!isNumber) _irregularAsNumbers.push_back(_positions[key]);
   }
 }
@@ -239,11 +183,9 @@ void XQueryJoinTable::scanTexts() {
 void XQueryJoinTable::countMemory() {
   const size_t bytes =
       _items->size() * sizeof(Value) + _keptKeys.size() * sizeof(Value) +
-      _keys.size() * sizeof(Operand) + _nodes.size() * sizeof(const NSObject*) +
-      _nodeBuckets.bytes() + _textBuckets.bytes() + _numberBuckets.bytes() +
-      (_positions.size() + _irregular.size() + _firstKeys.size()) * sizeof(uint32_t) +
-      _texts.size() * sizeof(NSStringView) + _numbers.size() * sizeof(double) +
-      (_textOrder.keys.size() + _numberOrder.keys.size()) * sizeof(uint32_t);
+      _keys.size() * sizeof(Operand) + _texts.bytes() + _numbers.bytes() + _exacts.bytes() +
+      _nodes.bytes() +
+      (_positions.size() + _irregular.size() + _firstKeys.size()) * sizeof(uint32_t);
   const int64_t more = static_cast<int64_t>(bytes) - _countedBytes;
   if (more > 0) countValueBytes(static_cast<size_t>(more));
   _countedBytes = std::max(_countedBytes, static_cast<int64_t>(bytes));
@@ -256,7 +198,7 @@ XQueryJoinTable::Way XQueryJoinTable::wayFor(const Value& probe, Operands& probe
   const XQueryItemList list(probe.get());
   if (_isIdentity) {
     if (list.count() > 1 || (list.count() == 1 && !list[0]->isNode())) return Way::Plain;
-    return list.count() == 1 && !_nodes.empty() ? Way::Nodes : Way::Nothing;
+    return list.count() == 1 && !_nodes.keys.empty() ? Way::Nodes : Way::Nothing;
   }
   if (_wantsOneProbe && list.count() > 1) return Way::Plain;
   if (_isComplement && list.count() != 1) return Way::Plain;
@@ -298,6 +240,14 @@ std::optional<XQueryJoinTable::Question> XQueryJoinTable::questionOf(const Value
       }
       keepDeciding(_relation, question.numbers);
       break;
+    case Way::Exacts:
+      readExacts();
+      for (size_t index = 0; index < question.operands.size(); ++index) {
+        const auto* number = cast<NSNumber>(XQueryItemList(probe.get())[index]);
+        question.exacts.push_back({question.operands[index].number, number});
+      }
+      keepDeciding(_relation, question.exacts);
+      break;
     default:
       break;
   }
@@ -306,27 +256,14 @@ std::optional<XQueryJoinTable::Question> XQueryJoinTable::questionOf(const Value
 
 template <class Visit>
 void XQueryJoinTable::forEachMet(const Question& question, bool wantsFirst, Visit visit) {
-  switch (question.way) {
-    case Way::Nodes:
-      return forEachEqual(_nodes, question.nodes, _nodeBuckets, {false, wantsFirst}, visit);
-    case Way::Texts:
-      if (_relation.test == XQueryRelation::Equal) {
-        return forEachEqual(_texts, question.texts, _textBuckets, {false, wantsFirst}, visit);
-      }
-      return forEachOrdered(_texts, question.texts, _textOrder, {false, wantsFirst}, visit);
-    case Way::Numbers:
-    case Way::NumbersButTies: {
-      const bool areTiesOpen = question.way == Way::NumbersButTies;
-      if (_relation.test == XQueryRelation::Equal) {
-        return forEachEqual(_numbers, question.numbers, _numberBuckets, {areTiesOpen, wantsFirst},
-                            visit);
-      }
-      return forEachOrdered(_numbers, question.numbers, _numberOrder, {areTiesOpen, wantsFirst},
-                            visit);
+  const Asked asked{question.way == Way::NumbersButTies, wantsFirst};
+  withForm(question, [&](auto& form, const auto& probes) {
+    if (_relation.test == XQueryRelation::Equal) {
+      forEachEqual(probes, form, asked, visit);
+    } else {
+      forEachOrdered(probes, form, asked, visit);
     }
-    default:
-      return;
-  }
+  });
 }
 
 void XQueryJoinTable::select(const Question& question, Selection& selection, bool wantsFirst) {
@@ -358,77 +295,57 @@ std::optional<bool> XQueryJoinTable::meets(const Value& probe) {
 }
 
 size_t XQueryJoinTable::estimateFor(const Question& question) {
-  switch (question.way) {
-    case Way::Nodes:
-      return 1;
-    case Way::Texts:
-      return estimate(_texts, question.texts, _textBuckets, _textOrder);
-    case Way::Numbers:
-    case Way::NumbersButTies:
-      return estimate(_numbers, question.numbers, _numberBuckets, _numberOrder);
-    default:
-      return 0;
-  }
+  if (question.way == Way::Nodes) return 1;
+  size_t number = 0;
+  withForm(question, [&](auto& form, const auto& probes) { number = estimate(probes, form); });
+  return number;
 }
 
 template <class Key>
-size_t XQueryJoinTable::estimate(const std::vector<Key>& keys, const std::vector<Key>& probes,
-                                 Buckets& buckets, Order& order) {
+size_t XQueryJoinTable::estimate(const std::vector<Key>& probes, Form<Key>& form) {
   if (probes.empty()) return 0;
   if (_relation.test != XQueryRelation::Equal) {
-    if (order.keys.empty()) return keys.size() / 2;
-    return metInOrder(_relation, keys, probes.front(), order).size();
+    if (form.order.keys.empty()) return form.keys.size() / 2;
+    return metInOrder(_relation, probes.front(), form).size();
   }
-  if (!buckets.isBuilt()) buckets.build(keys);
+  if (!form.buckets.isBuilt()) form.buckets.build(form.keys);
   size_t count = 0;
-  for (const Key& probe : probes) count += buckets.at(hashOf(probe)).size();
+  for (const Key& probe : probes) count += form.buckets.at(XQueryHashOfKey(probe)).size();
   return count;
 }
 
+// Of keys that are sorted, asked in their order, it is a difference.
 std::optional<uint64_t> XQueryJoinTable::numberFor(const Question& question) {
-  const bool isOpen = question.way == Way::NumbersButTies || !isRegularFor(question);
-  if (isOpen || _isComplement || _hasSeveralKeys || !_irregular.empty()) return std::nullopt;
-  auto number = question.way == Way::Texts
-                    ? numberInOrder(_texts, question.texts, _textOrder)
-                    : numberInOrder(_numbers, question.numbers, _numberOrder);
-  if (!number) {
-    number = 0;
-    forEachMet(question, false, [&number](size_t, bool) {
-      ++*number;
-      return true;
-    });
-  }
+  if (!hasOneAnswerFor(question) || _isComplement) return std::nullopt;
+  uint64_t number = 0;
+  withForm(question, [&](auto& form, const auto& probes) {
+    const bool isOrdered = _relation.test != XQueryRelation::Equal;
+    if (isOrdered && !probes.empty() && form.order.asked >= askedToSort) {
+      number = metInOrder(_relation, probes.front(), form).size();
+    } else {
+      forEachMet(question, false, [&number](size_t, bool) {
+        ++number;
+        return true;
+      });
+    }
+  });
   countMemory();
   return number;
 }
 
-// Of keys that are sorted; nothing where they are not, or not asked in their order.
-template <class Key>
-std::optional<uint64_t> XQueryJoinTable::numberInOrder(const std::vector<Key>& keys,
-                                                       const std::vector<Key>& probes,
-                                                       Order& order) const {
-  const bool isAsked = _relation.test != XQueryRelation::Equal && !probes.empty();
-  if (!isAsked || order.asked < askedToSort) return std::nullopt;
-  return metInOrder(_relation, keys, probes.front(), order).size();
-}
-
 std::optional<bool> XQueryJoinTable::isMetBy(const Question& question, uint32_t position) {
   if (isIrregular(position)) return std::nullopt;
+  const bool isIrregularAsNumber =
+      isOfNumbers(question) &&
+      std::binary_search(_irregularAsNumbers.begin(), _irregularAsNumbers.end(), position);
+  if (isIrregularAsNumber) return std::nullopt;
   if (_firstKeys.empty()) findKeysOfItems();
-  switch (question.way) {
-    case Way::Nodes:
-      return isMet(_nodes, question.nodes, false, position);
-    case Way::Texts:
-      return isMet(_texts, question.texts, false, position);
-    case Way::Numbers:
-    case Way::NumbersButTies:
-      if (std::binary_search(_irregularAsNumbers.begin(), _irregularAsNumbers.end(), position)) {
-        return std::nullopt;
-      }
-      return isMet(_numbers, question.numbers, question.way == Way::NumbersButTies, position);
-    default:
-      return false;
-  }
+  const bool areTiesOpen = question.way == Way::NumbersButTies;
+  std::optional<bool> answer = false;
+  withForm(question, [&](const auto& form, const auto& probes) {
+    answer = isMet(form.keys, probes, areTiesOpen, position);
+  });
+  return answer;
 }
 
 template <class Key>
@@ -438,14 +355,14 @@ std::optional<bool> XQueryJoinTable::isMet(const std::vector<Key>& keys,
   if (probes.empty()) return false;
   bool isOpen = false;
   for (uint32_t key = _firstKeys[position]; key < _firstKeys[position + 1]; ++key) {
-    if (meetsNothing(keys[key])) continue;
+    if (XQueryMeetsNothing(keys[key])) continue;
     if (_relation.test == XQueryRelation::Equal) {
-      const auto before = [](const Key& a, const Key& b) { return orderOf(a, b) < 0; };
+      const auto before = [](const Key& a, const Key& b) { return XQueryOrderOfKeys(a, b) < 0; };
       if (!std::binary_search(probes.begin(), probes.end(), keys[key], before)) continue;
       if (!areTiesOpen) return true;
       isOpen = true;
     } else {
-      const int order = orderOf(keys[key], probes.front());
+      const int order = XQueryOrderOfKeys(keys[key], probes.front());
       if (areTiesOpen && order == 0) {
         isOpen = true;
       } else if (holds(_relation, keys[key], probes.front())) {
@@ -496,32 +413,45 @@ XQueryJoinTable::Way XQueryJoinTable::wayOfNumbers(const Operands& probes) const
         return Way::Plain;
     }
   }
-  return way;
+  if (way != Way::NumbersButTies || _hasFloating) return way;
+  const bool areDecimals = std::all_of(probes.begin(), probes.end(),
+                                       [](const Operand& probe) { return probe.isDecimal(); });
+  return areDecimals ? Way::Exacts : way;
 }
 
 void XQueryJoinTable::readTexts() {
-  if (!_texts.empty()) return;
-  _texts.reserve(_keys.size());
-  for (const Operand& key : _keys) _texts.push_back(key.text.view());
+  if (!_texts.keys.empty()) return;
+  _texts.keys.reserve(_keys.size());
+  for (const Operand& key : _keys) _texts.keys.push_back(key.text.view());
+}
+
+// All keys are numbers, which are kept.
+void XQueryJoinTable::readExacts() {
+  if (!_exacts.keys.empty()) return;
+  _exacts.keys.reserve(_keys.size());
+  for (size_t key = 0; key < _keys.size(); ++key) {
+    _exacts.keys.push_back({_keys[key].number, cast<NSNumber>(_keptKeys[key].get())});
+  }
 }
 
 // A few probes are compared with every key; for more of them the keys are sorted.
 template <class Key, class Visit>
-void XQueryJoinTable::forEachOrdered(const std::vector<Key>& keys, const std::vector<Key>& probes,
-                                     Order& order, Asked asked, Visit visit) {
+void XQueryJoinTable::forEachOrdered(const std::vector<Key>& probes, Form<Key>& form, Asked asked,
+                                     Visit visit) {
   if (probes.empty()) return;
+  const std::vector<Key>& keys = form.keys;
   const Key& probe = probes.front();
   // So many are found in the order of the items as quickly as put into it.
   constexpr size_t part = 16;
   const XQueryRelation relation = asked.areTiesOpen ? withTies(_relation) : _relation;
   const auto isTie = [&](size_t key) {
-    return asked.areTiesOpen && orderOf(keys[key], probe) == 0;
+    return asked.areTiesOpen && XQueryOrderOfKeys(keys[key], probe) == 0;
   };
   WorkPacer pacer;
-  if (order.asked < askedToSort) {
-    ++order.asked;
+  if (form.order.asked < askedToSort) {
+    ++form.order.asked;
   } else {
-    const auto met = metInOrder(relation, keys, probe, order);
+    const auto met = metInOrder(relation, probe, form);
     if (met.size() < keys.size() / part) {
       for (const uint32_t key : met) {
         pacer.turn();
@@ -532,60 +462,41 @@ void XQueryJoinTable::forEachOrdered(const std::vector<Key>& keys, const std::ve
   }
   for (size_t key = 0; key < keys.size(); ++key) {
     pacer.turn();
-    if (meetsNothing(keys[key]) || !holds(relation, keys[key], probe)) continue;
+    if (XQueryMeetsNothing(keys[key]) || !holds(relation, keys[key], probe)) continue;
     if (!visit(key, isTie(key)) || (asked.wantsFirst && !isTie(key))) return;
   }
-}
-
-template <class Key>
-bool XQueryJoinTable::holds(XQueryRelation relation, const Key& key, const Key& probe) const {
-  if constexpr (std::is_same_v<Key, NSStringView>) {
-    if (_isPrefix) return key.startsWith(probe);
-  }
-  return relation.holds(orderOf(key, probe));
 }
 
 // The keys that meet a probe are the first ones in their order, or the last ones; those that begin
 // with it stand in a row.
 template <class Key>
-std::span<const uint32_t> XQueryJoinTable::metInOrder(XQueryRelation relation,
-                                                      const std::vector<Key>& keys,
-                                                      const Key& probe, Order& order) const {
-  std::vector<uint32_t>& sorted = order.keys;
+std::span<const uint32_t> XQueryJoinTable::metInOrder(XQueryRelation relation, const Key& probe,
+                                                      Form<Key>& form) const {
+  std::vector<uint32_t>& sorted = form.order.keys;
+  const std::vector<Key>& keys = form.keys;
   if (sorted.empty()) {
     for (size_t key = 0; key < keys.size(); ++key) {
-      if (!meetsNothing(keys[key])) sorted.push_back(static_cast<uint32_t>(key));
+      if (!XQueryMeetsNothing(keys[key])) sorted.push_back(static_cast<uint32_t>(key));
     }
     WorkPacer pacer;
     std::sort(sorted.begin(), sorted.end(), [&](uint32_t a, uint32_t b) {
       pacer.turn();
-      return orderOf(keys[a], keys[b]) < 0;
+      return XQueryOrderOfKeys(keys[a], keys[b]) < 0;
     });
   }
-  const auto isMet = [&](uint32_t key) { return holds(relation, keys[key], probe); };
-  if (_isPrefix) {
-    const auto isBefore = [&](uint32_t key) { return orderOf(keys[key], probe) < 0; };
-    const auto first = std::partition_point(sorted.begin(), sorted.end(), isBefore);
-    return {first, std::partition_point(first, sorted.end(), isMet)};
-  }
-  const bool fromLeast = (relation.test == XQueryRelation::Less) != relation.negated;
-  const auto border = std::partition_point(sorted.begin(), sorted.end(),
-                                           [&](uint32_t key) { return isMet(key) == fromLeast; });
-  const std::span<const uint32_t> all(sorted);
-  const auto count = static_cast<size_t>(border - sorted.begin());
-  return fromLeast ? all.first(count) : all.subspan(count);
+  return metAmong(relation, probe, keys, sorted);
 }
 
 template <class Key, class Visit>
-void XQueryJoinTable::forEachEqual(const std::vector<Key>& keys, const std::vector<Key>& probes,
-                                   Buckets& buckets, Asked asked, Visit visit) {
+void XQueryJoinTable::forEachEqual(const std::vector<Key>& probes, Form<Key>& form, Asked asked,
+                                   Visit visit) {
   if (probes.empty()) return;
-  if (!buckets.isBuilt()) buckets.build(keys);
+  if (!form.buckets.isBuilt()) form.buckets.build(form.keys);
   WorkPacer pacer;
   for (const Key& probe : probes) {
-    for (const uint32_t key : buckets.at(hashOf(probe))) {
+    for (const uint32_t key : form.buckets.at(XQueryHashOfKey(probe))) {
       pacer.turn();
-      if (!isEqual(keys[key], probe)) continue;
+      if (!XQueryAreEqualKeys(form.keys[key], probe)) continue;
       if (!visit(key, asked.areTiesOpen)) return;
       if (asked.wantsFirst && !asked.areTiesOpen) break;
     }

@@ -5,7 +5,8 @@
 //
 //   untyped   a node or an untyped value: compared by its text with text, as a number with numbers
 //   text      exactly xs:string: compared with text only
-//   number    compared with numbers, exactly when both are decimal and as doubles otherwise
+//   number    compared with numbers, exactly when both are decimal and as doubles otherwise: where
+//             some keys are decimal and others are not, those that are equal as doubles are asked
 //
 // and everything else (dates, other string types, truth values) is compared the plain way. So are
 // items whose key could not be read, or mixes kinds, or is no number where a number is asked for:
@@ -17,16 +18,21 @@
 #include "Expr/Operators/XQueryComparison.h"
 #include "Expr/XQueryPicker.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Joins/XQueryJoinKeyOrder.h"
 #include "Plan/Joins/XQueryJoinOperand.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Object.h"
 
 #include <algorithm>
+#include <bit>
 #include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <numeric>
 #include <optional>
 #include <span>
+#include <type_traits>
 #include <vector>
 
 namespace xquery {
@@ -95,11 +101,14 @@ class XQueryJoinTable final : public XQueryKeptValue {
   }
   // Whether no other item has to be asked because of what it is compared with.
   bool isRegularFor(const Question& question) const;
+  // Whether each item has one key at most, and none has to be asked.
+  bool hasOneAnswerFor(const Question& question) const;
   // Whether any item meets the comparison with the probe; nothing when it has to be compared the
   // plain way.
   std::optional<bool> meets(const Value& probe);
 
  private:
+  friend class XQueryJoinPair;
   using Operand = XQueryJoinOperand;
   using Operands = std::vector<Operand>;
 
@@ -129,14 +138,25 @@ class XQueryJoinTable final : public XQueryKeptValue {
     uint32_t asked = 0;
   };
 
+  // The keys as they are compared with certain probes, and ways to find them.
+  template <class Key>
+  struct Form {
+    std::vector<Key> keys;
+    Buckets buckets;
+    Order order;
+    size_t bytes() const {
+      return keys.size() * sizeof(Key) + buckets.bytes() + order.keys.size() * sizeof(uint32_t);
+    }
+  };
+
   void readKeys(const KeyReader& keyOf);
   void read(uint32_t position, const Value& value);
   bool readNode(uint32_t position, const XQueryItemList& keys);
   bool isTooLarge(int64_t bytesBefore) const;
-  bool takes(const Operands& keys);
+  bool takes(std::span<const Operand> keys);
   // How the keys are compared with certain probes. Decimals that are equal as doubles need not be
-  // equal, which leaves it open what they meet.
-  enum class Way : uint8_t { Plain, Nothing, Nodes, Texts, Numbers, NumbersButTies };
+  // equal, which leaves it open what they meet where not all keys are decimals.
+  enum class Way : uint8_t { Plain, Nothing, Nodes, Texts, Numbers, NumbersButTies, Exacts };
   struct Asked {
     bool areTiesOpen;
     bool wantsFirst;
@@ -145,14 +165,14 @@ class XQueryJoinTable final : public XQueryKeptValue {
   Way wayOfNumbers(const Operands& probes) const;
   void scanTexts();
   void readTexts();
+  void readExacts();
   void findKeysOfItems();
   static bool isOfNumbers(const Question& question);
+  // Calls use(form, probes) for the form that decides a question; not where nothing is met.
+  template <class Use>
+  void withForm(const Question& question, Use use);
   template <class Key>
-  size_t estimate(const std::vector<Key>& keys, const std::vector<Key>& probes, Buckets& buckets,
-                  Order& order);
-  template <class Key>
-  std::optional<uint64_t> numberInOrder(const std::vector<Key>& keys,
-                                        const std::vector<Key>& probes, Order& order) const;
+  size_t estimate(const std::vector<Key>& probes, Form<Key>& form);
   template <class Key>
   std::optional<bool> isMet(const std::vector<Key>& keys, const std::vector<Key>& probes,
                             bool areTiesOpen, uint32_t position) const;
@@ -161,16 +181,18 @@ class XQueryJoinTable final : public XQueryKeptValue {
   template <class Visit>
   void forEachMet(const Question& question, bool wantsFirst, Visit visit);
   template <class Key, class Visit>
-  void forEachEqual(const std::vector<Key>& keys, const std::vector<Key>& probes, Buckets& buckets,
-                    Asked asked, Visit visit);
+  void forEachEqual(const std::vector<Key>& probes, Form<Key>& form, Asked asked, Visit visit);
   template <class Key, class Visit>
-  void forEachOrdered(const std::vector<Key>& keys, const std::vector<Key>& probes, Order& order,
-                      Asked asked, Visit visit);
+  void forEachOrdered(const std::vector<Key>& probes, Form<Key>& form, Asked asked, Visit visit);
   template <class Key>
   bool holds(XQueryRelation relation, const Key& key, const Key& probe) const;
   template <class Key>
-  std::span<const uint32_t> metInOrder(XQueryRelation relation, const std::vector<Key>& keys,
-                                       const Key& probe, Order& order) const;
+  std::span<const uint32_t> metInOrder(XQueryRelation relation, const Key& probe,
+                                       Form<Key>& form) const;
+  template <class Key>
+  std::span<const uint32_t> metAmong(XQueryRelation relation, const Key& probe,
+                                     const std::vector<Key>& keys,
+                                     std::span<const uint32_t> sorted) const;
   void countMemory();
 
   const XQueryRelation _relation;
@@ -185,6 +207,7 @@ class XQueryJoinTable final : public XQueryKeptValue {
   bool _holdsNumbers = false;  // ... or numbers; neither while there is no key
   bool _hasDecimals = false;
   bool _hasInexactDecimals = false;
+  bool _hasFloating = false;
   bool _isScanned = false;
   bool _hasSeveralKeys = false;  // of one item
   int64_t _countedBytes = 0;
@@ -194,18 +217,15 @@ class XQueryJoinTable final : public XQueryKeptValue {
   std::vector<uint32_t> _positions;  // of the item of each key
   std::vector<uint32_t> _irregular;  // positions of the items that have to be asked
   std::vector<uint32_t> _irregularAsNumbers;
-  std::vector<NSStringView> _texts;     // of each key
-  std::vector<double> _numbers;         // of each key; NaN for one that is none
-  std::vector<const NSObject*> _nodes;  // instead, where nodes are looked for
-  std::vector<uint32_t> _firstKeys;     // of each item, in the list of the positions
-  Buckets _nodeBuckets;
-  Buckets _textBuckets;
-  Buckets _numberBuckets;
-  Order _textOrder;
-  Order _numberOrder;
+  std::vector<uint32_t> _firstKeys;  // of each item, in the list of the positions
+  Form<NSStringView> _texts;         // of each key
+  Form<double> _numbers;             // of each key; NaN for one that is none
+  Form<XQueryExactKey> _exacts;      // of each key, where all are decimals
+  Form<const NSObject*> _nodes;      // instead, where nodes are looked for
 };
 
 class XQueryJoinTable::Question {
+  friend class XQueryJoinPair;
   friend class XQueryJoinTable;
   Way way = Way::Nothing;
   Value probe;
@@ -213,6 +233,7 @@ class XQueryJoinTable::Question {
   // What decides: of an order one, otherwise each once, in order.
   std::vector<NSStringView> texts;
   std::vector<double> numbers;
+  std::vector<XQueryExactKey> exacts;
   std::vector<const NSObject*> nodes;
 };
 
@@ -220,8 +241,78 @@ inline bool XQueryJoinTable::isOfNumbers(const Question& question) {
   return question.way == Way::Numbers || question.way == Way::NumbersButTies;
 }
 
+inline bool XQueryJoinTable::hasOneAnswerFor(const Question& question) const {
+  return !_hasSeveralKeys && _irregular.empty() && question.way != Way::NumbersButTies &&
+         isRegularFor(question);
+}
+
 inline bool XQueryJoinTable::isRegularFor(const Question& question) const {
   return !isOfNumbers(question) || _irregularAsNumbers.empty();
+}
+
+template <class Key>
+void XQueryJoinTable::Buckets::build(const std::vector<Key>& keys) {
+  const size_t buckets = std::bit_ceil(2 * keys.size() + 1);
+  _starts.assign(buckets + 1, 0);
+  _keys.resize(keys.size());
+  std::vector<uint32_t> bucketOf(keys.size());
+  WorkPacer pacer;
+  for (size_t key = 0; key < keys.size(); ++key) {
+    pacer.turn();
+    bucketOf[key] = static_cast<uint32_t>(XQueryHashOfKey(keys[key]) & (buckets - 1));
+    ++_starts[bucketOf[key] + 1];
+  }
+  std::partial_sum(_starts.begin(), _starts.end(), _starts.begin());
+  // From the last key on: where a bucket ends goes back to where it starts.
+  for (size_t key = keys.size(); key-- > 0;) {
+    pacer.turn();
+    _keys[--_starts[bucketOf[key] + 1]] = static_cast<uint32_t>(key);
+  }
+  _starts.erase(_starts.begin());
+  _starts.push_back(static_cast<uint32_t>(keys.size()));
+}
+
+template <class Use>
+void XQueryJoinTable::withForm(const Question& question, Use use) {
+  switch (question.way) {
+    case Way::Nodes:
+      return use(_nodes, question.nodes);
+    case Way::Texts:
+      return use(_texts, question.texts);
+    case Way::Numbers:
+    case Way::NumbersButTies:
+      return use(_numbers, question.numbers);
+    case Way::Exacts:
+      return use(_exacts, question.exacts);
+    default:
+      return;
+  }
+}
+
+template <class Key>
+bool XQueryJoinTable::holds(XQueryRelation relation, const Key& key, const Key& probe) const {
+  if constexpr (std::is_same_v<Key, NSStringView>) {
+    if (_isPrefix) return key.startsWith(probe);
+  }
+  return relation.holds(XQueryOrderOfKeys(key, probe));
+}
+
+// Of some keys that are sorted.
+template <class Key>
+std::span<const uint32_t> XQueryJoinTable::metAmong(XQueryRelation relation, const Key& probe,
+                                                    const std::vector<Key>& keys,
+                                                    std::span<const uint32_t> sorted) const {
+  const auto isMet = [&](uint32_t key) { return holds(relation, keys[key], probe); };
+  const auto isBefore = [&](uint32_t key) { return XQueryOrderOfKeys(keys[key], probe) < 0; };
+  if (_isPrefix || relation.test == XQueryRelation::Equal) {
+    const auto first = std::partition_point(sorted.begin(), sorted.end(), isBefore);
+    return {first, std::partition_point(first, sorted.end(), isMet)};
+  }
+  const bool fromLeast = (relation.test == XQueryRelation::Less) != relation.negated;
+  const auto border = std::partition_point(sorted.begin(), sorted.end(),
+                                           [&](uint32_t key) { return isMet(key) == fromLeast; });
+  const auto count = static_cast<size_t>(border - sorted.begin());
+  return fromLeast ? sorted.first(count) : sorted.subspan(count);
 }
 
 }  // namespace xquery
