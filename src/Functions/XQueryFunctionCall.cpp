@@ -92,6 +92,19 @@ bool XQueryFunctionCall::evaluateArguments(XQueryContext& context) const {
   return true;
 }
 
+// The arguments go straight into the callee's frame, which is not in force yet. False for an error
+// among them.
+inline bool XQueryFunctionCall::makeFrame(XQueryFrameRef& frame, XQueryContext& context) const {
+  const auto& params = _functionDecl->params();
+  if (!params.empty()) frame = make<XQueryFrame>();
+  for (size_t index = 0; index < params.size(); ++index) {
+    Value value = argument(index, context);
+    if (XQueryHasFailed(value, context)) return false;
+    if (const int64_t varID = params[index]->varID()) frame->setValue(std::move(value), varID);
+  }
+  return true;
+}
+
 Value XQueryFunctionCall::callDeclared(XQueryContext& context) const {
   auto& dynamic = context._internal();
   const auto& params = _functionDecl->params();
@@ -102,19 +115,32 @@ Value XQueryFunctionCall::callDeclared(XQueryContext& context) const {
   if (_functionDecl->isExternal()) {
     return evaluateArguments(context) ? failUndefined(context) : Value();
   }
-  // The arguments go straight into the callee's frame, which is not in force yet.
-  XQueryFrameRef frame = params.empty() ? XQueryFrameRef() : make<XQueryFrame>();
-  for (size_t index = 0; index < params.size(); ++index) {
-    Value value = argument(index, context);
-    if (XQueryHasFailed(value, context)) return {};
-    if (const int64_t varID = params[index]->varID()) frame->setValue(std::move(value), varID);
-  }
+  XQueryFrameRef frame;
+  if (!makeFrame(frame, context)) return {};
   const CalleeFrame calleeFrame(dynamic, std::move(frame));
   const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
   Value result = _functionDecl->expr()->evaluateWithContext(context);
   if (!result) return dynamic.isFailing() ? Value() : failUndefined(context);
   if (auto* error = dyn_cast<XQueryError>(result)) return dynamic.fail(error);
   return result;
+}
+
+bool XQueryFunctionCall::hasBody() const {
+  return _functionDecl && !_functionDecl->isExternal() && _functionDecl->expr() &&
+         _functionDecl->params().size() == argumentCount();
+}
+
+bool XQueryFunctionCall::askBody(const std::function<bool(const XQueryExpr& body)>& ask,
+                                 XQueryContext& context) const {
+  XQueryCheckStack(context);
+  XQueryFrameRef frame;
+  if (!makeFrame(frame, context)) return false;
+  auto& dynamic = context._internal();
+  const CalleeFrame calleeFrame(dynamic, std::move(frame));
+  const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
+  if (ask(*_functionDecl->expr())) return true;
+  if (!dynamic.isFailing()) failUndefined(context);
+  return false;
 }
 
 Value XQueryFunctionCall::evaluatePartOfBody(const XQueryExpr& part,

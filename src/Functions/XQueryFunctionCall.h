@@ -6,11 +6,13 @@
 #include "Functions/XQueryBuiltInFunction.h"
 
 #include <cstddef>
+#include <functional>
 #include <span>
 #include <utility>
 
 namespace xquery {
 
+class XQueryFrame;
 class XQueryFunctionDecl;
 
 class XQueryFunctionCall : public XQueryExpr {
@@ -41,6 +43,12 @@ class XQueryFunctionCall : public XQueryExpr {
   // An error that the function answers is one of the call.
   Value computeValue(XQueryContext& context) const override;
   void visitParts(XQueryPartVisitor& visitor) override;
+  // Whether a declared function is called that has a body and takes so many arguments.
+  bool hasBody() const;
+  // Of such a call: asks the body for something else than its value, in the callee's frame. False
+  // after an error, which not being answered is as well.
+  bool askBody(const std::function<bool(const XQueryExpr& body)>& ask,
+               XQueryContext& context) const;
   // Of a declared function: what a part of its body comes to in this call, where it reads these
   // parameters and no other local variable. The other arguments are not evaluated.
   Value evaluatePartOfBody(const XQueryExpr& part, std::span<const size_t> parameters,
@@ -58,6 +66,7 @@ class XQueryFunctionCall : public XQueryExpr {
     return _args->objectAtIndex(index)->evaluateWithContext(context);
   }
   bool evaluateArguments(XQueryContext& context) const;
+  bool makeFrame(Ref<XQueryFrame>& frame, XQueryContext& context) const;
   Value callDeclared(XQueryContext& context) const;
   Value callBuiltIn(XQueryContext& context) const;
   Value callBuiltIn(Value* arguments, size_t count, XQueryContext& context) const;

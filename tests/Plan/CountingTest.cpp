@@ -117,6 +117,66 @@ TEST(Counting, FLWORsAndFilters) {
   }
 }
 
+TEST(Counting, CallsOfFunctionsThatFilter) {
+  const std::string prolog =
+      "declare function local:of($l, $k) { $l[@k = $k] };"
+      "declare function local:below($l, $k) { ($l/q[. < $k]) };"
+      "declare function local:both($l, $k) { local:of($l, $k)[q] };"
+      "declare function local:bad($l, $k) { $l[xs:integer(q[1]) = $k] };"
+      "declare function local:each($l, $k) { for $i in $l where $i/@k = $k return $i };"
+      "declare function local:error($l, $k) { some $q as xs:integer in 'a' satisfies 1 };"
+      "declare function local:errors($l, $k) { ($k, local:error(1, 1), $l)[2][. = $k] };"
+      "declare function local:focus($l, $k) { . };"
+      "declare function local:again($l, $k) { if ($k = 3) then local:again($l, 4) else $l[q = $k] "
+      "};";
+  for (const char* call :
+       {"of(//i, $x)", "below(//i, $x)", "both(//i, $x)", "bad(//i, $x)", "each(//i, $x)",
+        "again(//i, $x)", "of((1, 2), $x)", "of((), $x)", "of($x)", "none($x)", "error(1, 2)",
+        "errors(//i, $x)", "focus(1, 2)", "of(//i, xs:integer('x'))", "of((1 to 9, 'a'), $x)"}) {
+    for (const char* question : {"count(#)", "exists(#)", "empty((#))", "2 < count(#)", "not(#)",
+                                 "(let $l := # return count($l))"}) {
+      std::string text = question;
+      text.replace(text.find('#'), 1, "local:" + std::string(call));
+      sameBothWays(prolog + "for $x in (0 to 20, '3', 'x', 2.5, ()) return " + text, items());
+    }
+  }
+  const std::string filter = "declare function local:of($l, $k) { $l[@k = $k] };";
+  EXPECT_EQ(choicesOf("counts", filter + "count(local:of(//i, 3))"), 1U);
+  EXPECT_EQ(choicesOf("counts", filter + "count(local:of(//i))"), 0U);
+  EXPECT_EQ(choicesOf("counts", filter + "count(local:none(//i))"), 0U);
+}
+
+// Of two comparisons, both asked often, the items that meet both are found at once.
+TEST(Counting, ItemsThatMeetTwoConditions) {
+  for (const char* condition :
+       {"@k = $y/@k and @n > $y/@n", "number(@n) < number($y/@n) and $y/@k = @k",
+        "@k = $y/@k and xs:decimal(@n) >= xs:decimal($y/@n) div 10", "@k = $y/@k and @n = $y/@n",
+        "@k = ($y/@k, '3') and q = $y/q", "q = $y/q and p < $y/p", "@k = $y/@k and p < $y/p",
+        "@k = $y/@k and starts-with(@n, $y/@k)", "@k = $y/@k and number(p[1]) < number($y/p[1])",
+        "@k = $y/@k and @n > $y/@n and q = $y/q"}) {
+    const std::string text(condition);
+    for (const char* question : {"count(//i[#])", "//i[#]/@n", "count(//*[#]/q)", "//i[#][1]",
+                                 "(//i, //i)[#]/@n", "count((//i, //i)[#])", "exists(//i[#])"}) {
+      std::string query = question;
+      query.replace(query.find('#'), 1, text);
+      sameBothWays("for $y in //i return " + query, items());
+    }
+  }
+  for (const char* condition :
+       {"$i/@k = $y/@k and $i/@n > $y/@n", "number($i/@n) < number($y/@n) and $y/@k = $i/@k",
+        "$i/@k = $y/@k and xs:integer($i/@n) > xs:integer($y/@n) + 3"}) {
+    const std::string text(condition);
+    for (const char* question :
+         {"count(for $i in //i where # return $i)", "for $i in //i where # return $i/@n",
+          "sum(for $i in //i return if (#) then 1 else 0)", "some $i in //i satisfies (#)",
+          "every $i in //i satisfies not(#)", "for $i at $p in //i where # return $p"}) {
+      std::string query = question;
+      query.replace(query.find('#'), 1, text);
+      sameBothWays("for $y in //i return (" + query + ")", items());
+    }
+  }
+}
+
 TEST(Counting, LeavesAloneWhatIsNoQuestionOfNumber) {
   for (const char* text : {
            "boolean(for $i in //i return string($i))",

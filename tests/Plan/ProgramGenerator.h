@@ -58,7 +58,7 @@ class ProgramGenerator {
   // A function of one parameter. One that calls itself does so with less each time.
   std::string function(const std::string& name, const std::string& recursion) {
     _variables = {"$p"};
-    std::string body = expr(3);
+    std::string body = _random.below(4) ? expr(3) : "$p[" + matches(".") + "]";
     if (!recursion.empty()) {
       body = "if (not($p castable as xs:integer) or number($p) < 1 or number($p) > 6) then " +
              body + " else (" + expr(1) + ", " + recursion + "(number($p) - 1))";
@@ -95,7 +95,9 @@ class ProgramGenerator {
       case 1:
         return "[" +
                _random.oneOf({"@x", "b", "c/a", "not(@y)", "b and @x", "not(a or @y = 1)",
-                              "ancestor::b", "not(. = 'u') and c", "exists(b[. = 2])"}) +
+                              "ancestor::b", "not(. = 'u') and c", "exists(b[. = 2])",
+                              "not(preceding-sibling::a)", "following-sibling::b or @x",
+                              "preceding-sibling::b = 'u'", "empty(following-sibling::node())"}) +
                "]";
       case 2:
         return "[" + nameCondition() + "]";
@@ -155,7 +157,8 @@ class ProgramGenerator {
   std::string nearbyNode() {
     const std::string found =
         _random.oneOf({"ancestor::a", "ancestor-or-self::b", "ancestor::node()", "../b", "a", "@x",
-                       "b/text()", variable() + "/c", variable() + "/ancestor::a"});
+                       "b/text()", variable() + "/c", variable() + "/ancestor::a",
+                       "preceding-sibling::a", "following-sibling::*/c"});
     const std::string both =
         _random.below(2) ? found + " intersect " + variable() : variable() + " intersect " + found;
     return _random.oneOf({"", "not", "exists", "c and ", "not(@x) or "}) + "(" + both + ")";
@@ -420,11 +423,25 @@ class ProgramGenerator {
   }
 
   std::string matches(const std::string& item) {
+    if (_random.below(6) == 0) return twoMatches(item);
     std::string text = match(item);
     while (_random.below(3) == 0) {
       text += " and " + (_random.below(3) ? match(item) : match(variable()));
     }
     return text;
+  }
+
+  // An equality and something else of the same items, both with one key for most of them.
+  std::string twoMatches(const std::string& item) {
+    const std::string other = variable();
+    const std::string key = _random.oneOf({"/@x", "/@y"});
+    const auto side = [&](const std::string& of) { return of + _random.oneOf({"/@x", "/@y"}); };
+    const std::string function = _random.oneOf({"", "number", "string", "xs:decimal"});
+    const std::string equality = item + key + " = " + other + key;
+    const std::string second = function + "(" + side(item) + ")" +
+                               _random.oneOf({" < ", " >= ", " = ", " > "}) + function + "(" +
+                               side(other) + ")";
+    return _random.below(2) ? equality + " and " + second : second + " and " + equality;
   }
 
   std::string joined(int depth) {
@@ -485,7 +502,9 @@ class ProgramGenerator {
       return _random.oneOf({"$u", "$u", "1", "3", "$u/@x", "(1, $u)", "string($u)", variable()});
     };
     const std::string list = within("$u", [&] {
-      switch (_random.below(4)) {
+      switch (_random.below(5)) {
+        case 4:
+          return _functions.empty() ? many() : _functions.front() + "(" + many() + ")";
         case 0:
           return clause + "return if (" + matches("$u") + ") then " + item() + " else ()";
         case 1:

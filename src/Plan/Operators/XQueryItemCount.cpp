@@ -3,7 +3,9 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryFLWOR.h"
+#include "Expr/XQueryLists.h"
 #include "Expr/XQuerySequence.h"
+#include "Functions/XQueryFunctionCall.h"
 #include "xquery/Number.h"
 
 #include <optional>
@@ -11,9 +13,36 @@
 namespace xquery {
 namespace {
 
+// Whether it counts nodes, or picks items, among which there is no error.
+const XQueryWalkedPath* countingPathIn(const XQueryExpr& expr) {
+  const auto* planned = dyn_cast<XQueryPlannedExpr>(XQueryWithoutParentheses(&expr));
+  const XQueryWalkedPath* path = planned ? planned->walkedPath() : nullptr;
+  if (!path) return nullptr;
+  return path->countsNodes() || (path->steps().empty() && path->picker()) ? path : nullptr;
+}
+
+// A body that answers one error by itself makes the call fail.
+std::optional<uint64_t> countItemsOfCall(const XQueryFunctionCall& call, uint64_t most,
+                                         XQueryContext& context) {
+  std::optional<uint64_t> count;
+  const auto ask = [&](const XQueryExpr& body) {
+    const XQueryWalkedPath* path = countingPathIn(body);
+    if (path) count = path->countItems(most, context);
+    if (count || context._internal().isFailing()) return count.has_value();
+    const Value items = body.evaluateWithContext(context);
+    if (auto* error = dyn_cast<XQueryError>(items)) context._internal().fail(error);
+    if (!items || context._internal().isFailing()) return false;
+    count = XQueryItemList(items.get()).count();
+    return true;
+  };
+  return call.askBody(ask, context) ? count : std::nullopt;
+}
+
 // None after an error, and where there is no value, as "." has none without a focus.
 std::optional<uint64_t> countItems(const XQueryExpr& expr, uint64_t most, XQueryContext& context) {
   if (const auto* flwor = dyn_cast<XQueryFLWORExpr>(&expr)) return flwor->countItems(most, context);
+  const auto* call = dyn_cast<XQueryFunctionCall>(&expr);
+  if (call && call->hasBody()) return countItemsOfCall(*call, most, context);
   const auto* planned = dyn_cast<XQueryPlannedExpr>(&expr);
   if (planned && planned->walkedPath()) return planned->walkedPath()->countItems(most, context);
   const Value items = expr.evaluateWithContext(context);
@@ -25,6 +54,7 @@ std::optional<uint64_t> countItems(const XQueryExpr& expr, uint64_t most, XQuery
 
 bool XQueryCountsItems(const XQueryExpr& expr) {
   if (const auto* flwor = dyn_cast<XQueryFLWORExpr>(&expr)) return flwor->orderSpecs().empty();
+  if (const auto* call = dyn_cast<XQueryFunctionCall>(&expr)) return call->hasBody();
   const auto* planned = dyn_cast<XQueryPlannedExpr>(&expr);
   return planned && planned->walkedPath() && planned->walkedPath()->steps().empty();
 }

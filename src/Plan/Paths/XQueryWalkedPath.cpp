@@ -122,7 +122,8 @@ std::optional<uint64_t> XQueryWalkedPath::countItems(uint64_t most, XQueryContex
   Value contextItem = dynamic.contextItem();
   std::optional<uint64_t> number;
   const Value items = evaluateStart(context, &number);
-  if (!items) return std::nullopt;
+  // An error among the items, alone, may be one of what asks for them.
+  if (!items || isa<XQueryError>(items)) return std::nullopt;
   dynamic.setContextItem(std::move(contextItem), position);
   dynamic.setLast(last);
   return std::min(number.value_or(XQueryItemList(items.get()).count()), most);

@@ -5,7 +5,8 @@
 //             "or"
 // Facts       E is a path whose last step is an axis step, all of whose tests and predicates can be
 //             repeated and cannot fail once the first step is evaluated
-//             (XQueryWalkedPath::countsNodes); or it is a FLWOR without order specs, or a filter.
+//             (XQueryWalkedPath::countsNodes); or it is a FLWOR without order specs, a filter, or
+//             a call of a declared function, whose body may be a filter or a path.
 //             Of these only nodes are asked for their truth. They are evaluated to the end unless
 //             they can be repeated, cannot fail but in what the first clause walks, and leave
 //             nothing in variables that can be told. "b[6]", where its truth is asked for, is
