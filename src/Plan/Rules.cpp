@@ -31,6 +31,8 @@ constexpr std::array rules = {
                XQueryTakeFirst},
     XQueryRule{"members", "whether one node is in a large set is looked up in a table",
                XQueryAskMembers},
+    XQueryRule{"index-of", "where a value stands in a list is looked up in a table",
+               XQueryFindPositions},
     XQueryRule{"nearby nodes", "whether a few steps find one node is asked without a list of all",
                XQueryFindNearbyNodes},
     XQueryRule{"texts", "comparing children and attributes with a constant makes no values",

@@ -468,6 +468,7 @@ class ProgramGenerator {
     if (_random.below(5) == 0) return conditional(depth);
     if (_random.below(5) == 0) return chain();
     if (_random.below(6) == 0) return earlier();
+    if (_random.below(8) == 0) return positions();
     std::string text = "for $u in " + many() + " ";
     return "(" + text +
            within("$u",
@@ -602,6 +603,15 @@ class ProgramGenerator {
                               "]" + step;
     return "(let $l := " + many() + " for $u at $n in " + _random.oneOf({"$l", "$l", "($l, $l)"}) +
            " where " + _random.oneOf({"", "not"}) + "(" + sides + ") return $u)";
+  }
+
+  // Where values stand in a list.
+  std::string positions() {
+    const std::string list = _random.oneOf({"data(//@x)", "//*", "(//@*, 1, 2.5, 'u')", many()});
+    return "(let $l := " + list + " for $u in " + many() + " return " +
+           _random.oneOf({"", "count", "exists"}) + "(index-of($l, " +
+           _random.oneOf({"string($u)", "$u", "number($u)", "data($u/@x)", "string($o/@x)"}) +
+           ")))";
   }
 
   std::string negatedFor(const std::string& kind, const std::string& condition) {
