@@ -23,6 +23,11 @@ class ProgramGenerator {
       for (size_t i = 0; i < nodesOfIndexedTree; ++i) text += "<!---->";
       text += element(3);
     }
+    if (_random.below(12) == 0) {
+      for (size_t i = 0; i < elementsWorthAnIndex; ++i) {
+        text += "<b x='" + word() + "'><c>" + word() + "</c></b>";
+      }
+    }
     return text + "</a>";
   }
 
@@ -39,6 +44,7 @@ class ProgramGenerator {
 
  private:
   static constexpr size_t nodesOfIndexedTree = 260;
+  static constexpr size_t elementsWorthAnIndex = 80;
 
   std::string element(int depth) {
     const std::string name = _random.oneOf({"a", "b", "c", "a", "b", "c", "a", "p:a"});
@@ -614,6 +620,40 @@ class ProgramGenerator {
            ")))";
   }
 
+  // What has a certain value, asked so often that an index of values is worth its making.
+  std::string lookedUp(int depth) {
+    const std::string key = _random.oneOf({"@x", "@x", "c", ".", "b/@x", ".//c", "@*", "./c"});
+    const std::string probe =
+        _random.oneOf({"'1'", "'u'", "''", "'2.5'", "1", "$o", "string($o)", operand(1)});
+    const std::string equals = _random.oneOf({" = ", " = ", " eq ", " != "}) + probe;
+    const auto condition = [&](const std::string& of) {
+      const std::string from = of == "." ? key : key == "." ? of : of + "/" + key;
+      const std::string inner = _random.oneOf({"$w" + equals, probe + " = $w", "$w" + equals});
+      return _random.oneOf(
+          {from + equals, from + equals, "some $w in " + from + " satisfies " + inner,
+           from + "[." + equals + "]", "exists(" + from + "[." + equals + "])",
+           "not(empty(for $w in " + from + " where " + inner + " return $w))",
+           "boolean(" + from + "[" + probe + " eq .])", "string(" + from + ")" + equals,
+           "data(" + from + ")" + equals, from + equals + " and " + comparison(depth - 1)});
+    };
+    const std::string path = _random.oneOf({"//b", "//*", "/a/b", "//@x", "(//a | //b)", "/*/*",
+                                            "//(b | c)", "(//b)", "/descendant::b", "$g//b"});
+    const std::string all = _hasGlobal || !path.starts_with("$") ? path : "//b";
+    std::string text = "(for $o in ('1', //b[1]/@x, '2', 1, '1') return ";
+    return text + within("$o", [&] {
+             if (_random.below(2)) {
+               return all + "[" + condition(".") + "]" +
+                      _random.oneOf({"", "/..", "/@x", "[1]", predicate(depth - 1)}) + ")";
+             }
+             const std::string clause =
+                 _random.oneOf({"", "let $v := string($u/@x) ", "let $v := $u/c "});
+             const std::string where =
+                 clause.empty() || _random.below(2) ? condition("$u") : "$v" + equals;
+             return "(for $u in " + all + " " + clause + "where " + where + " return $u" +
+                    _random.oneOf({"", "/..", "/@x"}) + "))";
+           });
+  }
+
   std::string negatedFor(const std::string& kind, const std::string& condition) {
     return kind == "every" && _random.below(3) ? "not(" + condition + ")" : condition;
   }
@@ -627,7 +667,9 @@ class ProgramGenerator {
 
   std::string expr(int depth) {
     if (depth <= 0) return _random.below(3) ? variable() : literal();
-    switch (_random.below(18)) {
+    switch (_random.below(19)) {
+      case 18:
+        return lookedUp(depth);
       case 17:
         return "(" + existence(depth) + ")";
       case 0:

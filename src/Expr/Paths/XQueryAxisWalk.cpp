@@ -1,11 +1,11 @@
 #include "Expr/Paths/XQueryAxisWalk.h"
 
+#include "Platform/Tree/Arena.h"
+
 namespace xquery {
 
 NSXMLNode* XQueryDescendantStop(const NSXMLNode* node) {
-  if (NSXMLNode* sibling = node->nextSibling()) return sibling;
-  const NSXMLNode* parent = node->parent();
-  return parent ? parent->nextSibling() : nullptr;
+  return NSXMLTree::descendantStop(node);
 }
 
 NSXMLNode* XQueryFollowingStart(const NSXMLNode* node) {

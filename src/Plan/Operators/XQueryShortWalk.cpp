@@ -88,22 +88,4 @@ bool XQueryShortWalk::readStep(const XQueryAxisStep& step) {
   return true;
 }
 
-std::optional<NSXMLValueKey> XQueryShortWalk::valueKey(const NSXMLExpandedName& element) const {
-  NSXMLValueKey key;
-  key.element = NSXMLExpandedNameRef(&element);
-  for (size_t index = 0; index < _count; ++index) {
-    const Step& step = _steps[index];
-    const bool isLast = index + 1 == _count;
-    if (!step.name) return std::nullopt;
-    if (step.axis == XQueryAxisChild) {
-      key.children.emplace_back(step.name);
-    } else if (step.axis == XQueryAxisAttribute && isLast) {
-      key.attribute = NSXMLExpandedNameRef(step.name);
-    } else {
-      return std::nullopt;
-    }
-  }
-  return key;
-}
-
 }  // namespace xquery

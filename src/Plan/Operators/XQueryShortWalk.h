@@ -11,13 +11,11 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryAxisWalk.h"
 #include "Expr/Paths/XQueryPathRun.h"
-#include "Platform/Tree/ValueIndex.h"
 #include "xquery/XMLNode.h"
 
 #include <array>
 #include <cstddef>
 #include <cstdint>
-#include <optional>
 
 namespace xquery {
 
@@ -40,9 +38,6 @@ class XQueryShortWalk {
   bool startsFromFocus() const { return _varID == 0; }
   // The local variable that it starts from otherwise, and 0.
   int64_t variable() const { return _varID; }
-  // The key by which an index finds the elements of the name from which the walk leads to a value;
-  // none for a walk that it does not follow.
-  std::optional<NSXMLValueKey> valueKey(const NSXMLExpandedName& element) const;
 
   // The same of steps behind something else, which may be none.
   [[nodiscard]] bool readSteps(const XQueryStep* step);

@@ -177,20 +177,33 @@ void XQueryPathWalk::take(size_t index, int axis, NSXMLNode* node) {
 // False where the step has to walk.
 bool XQueryPathWalk::takeLookedUp(size_t index, int axis, NSXMLNode* node) {
   const XQueryWalkedStep& step = _steps[index];
-  const bool isOpen = axis == XQueryAxisChild || axis == XQueryAxisDescendant;
+  const bool isOpen =
+      axis == XQueryAxisChild || axis == XQueryAxisDescendant || axis == XQueryAxisAttributesBelow;
   if (!isOpen || listingStep || setsEveryFocus) return false;
   // Diagnostics would show an error of the value twice.
   if (context._internal().showsErrors()) return false;
-  if (XQueryStepTest(step, *this).onlyName() != step.lookup->element()) return false;
+  XQueryStepTest test(step, *this);
   std::vector<NSXMLNode*>& nodes = openNodeList();
-  const bool areFound = step.lookup->find(node, axis, context, nodes);
-  if (areFound && filterNodes(step, step.predicatesInTest, nodes)) {
+  const bool areFound = step.lookup->find(node, axis, test, context, nodes);
+  if (areFound && filtersEach(step)) {
+    takeEachKept(index, nodes);
+  } else if (areFound && filterNodes(step, step.predicatesInTest, nodes)) {
     takeNodes(index + 1, nodes);
   } else {
     hasFailed = hasFailed || areFound;
   }
   closeNodeList();
   return areFound;
+}
+
+void XQueryPathWalk::takeEachKept(size_t index, std::span<NSXMLNode* const> nodes) {
+  const XQueryWalkedStep& step = _steps[index];
+  WorkPacer pacer;
+  for (NSXMLNode* node : nodes) {
+    pacer.turn();
+    if (keepsAlone(step, step.predicatesInTest, node)) takeNode(index + 1, node);
+    if (isOver()) return;
+  }
 }
 
 // Whether it is of use to ask the predicates before all nodes are found, and nobody can tell.

@@ -81,6 +81,7 @@ class XQueryPathWalk : public XQueryPathRun {
   void take(size_t index, int axis, NSXMLNode* node);
   void takeCountedBelow(size_t index, NSXMLNode* node);
   bool takeLookedUp(size_t index, int axis, NSXMLNode* node);
+  void takeEachKept(size_t index, std::span<NSXMLNode* const> nodes);
   void stream(size_t index, int axis, NSXMLNode* node);
   template <class VisitOf>
   void streamMatching(size_t index, int axis, NSXMLNode* node, VisitOf visitOf);

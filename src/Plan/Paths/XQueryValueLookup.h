@@ -1,11 +1,17 @@
-// The elements of a step by a value that a predicate asks of them, as "person[@id = 'p1']" and
-// "book[author/last = $name]" do, from the index of the tree.
+// The nodes of a step by a value that a condition asks of them, as "person[@id = 'p1']",
+// "item[description//emph = 'x']" and "*[author/last = $name]" do, from the index of the tree.
 //
-// What is found are candidates: all elements, among those that the step would walk to, for which
-// the comparison can hold. Whoever asks goes on to filter them as if they had been walked to.
+// What is found are candidates: all nodes, among those that the step would walk to, for which the
+// condition can hold. Whoever asks goes on to filter them as if they had been walked to.
+//
+// Elements of one name have an index of their own (Platform/Tree/ValueIndex.h). Where the step
+// takes others as well, what has the value is found first, and the way from there goes up:
+//
+//   *[author/last = "x"]     last = "x"  ->  author  ->  *
+//   //@id[. = "x"]           elements with such an @id  ->  their @id
 #pragma once
 
-#include "Plan/Operators/XQueryShortWalk.h"
+#include "Plan/Paths/XQueryValueWay.h"
 #include "Platform/Tree/TreeIndexes.h"
 
 #include <optional>
@@ -13,25 +19,44 @@
 
 namespace xquery {
 
+class XQueryStepTest;
+
 class XQueryValueLookup {
  public:
-  // `walk` leads from an element to the values of `key`, `probe` is what they are compared with. It
-  // is repeatable and does not read the focus.
-  XQueryValueLookup(NSXMLValueKey key, const XQueryShortWalk& walk, Ref<XQueryExpr> probe)
-      : _key(std::move(key)), _walk(walk), _probe(std::move(probe)) {}
+  enum class Of : uint8_t {
+    Name,       // elements of one name
+    AnyName,    // elements, by a way of children that is not empty
+    Attribute,  // attributes of one name, by their own value
+  };
+  struct Probe {
+    Ref<XQueryExpr> expr;  // repeatable, does not read the focus
+    // An element without a value meets the empty text.
+    bool meetsNoneWhenEmpty = false;
+  };
 
-  const NSXMLExpandedName* element() const { return _key.element.get(); }
-  // Lists the candidates that the axis, which is child or descendant, leads to from the node, in
-  // document order; the list is empty before. False, and nothing listed, for: walk.
-  bool find(NSXMLNode* node, int axis, XQueryContext& context,
+  // `name` is that of the elements or attributes, null for any.
+  XQueryValueLookup(Of of, const NSXMLExpandedName* name, const XQueryValueWay& way, Probe probe);
+
+  // Lists the candidates that the axis, which is child, descendant or, for attributes, "//@a",
+  // leads to from the node, in document order; the list is empty before. False, and nothing listed,
+  // for: walk.
+  bool find(NSXMLNode* node, int axis, XQueryStepTest& test, XQueryContext& context,
             std::vector<NSXMLNode*>& candidates) const;
-  // After such a walk: of how many elements from the node on the predicate was asked.
-  void noteAsked(const NSXMLNode* node, size_t elements) const;
+  // After such a walk: of how many nodes from the node on the predicate was asked.
+  void noteAsked(const NSXMLNode* node, size_t nodes) const;
 
  private:
+  std::optional<NSXMLNodeSpan> elementsWith(const NSXMLValueIndex& values, XQueryContext& context,
+                                            const NSXMLNode* first, const NSXMLNode* stop) const;
+  void climb(NSXMLNodeSpan ends, const NSXMLNode* first, XQueryStepTest& test,
+             std::vector<NSXMLNode*>& candidates) const;
+  void listAttributes(NSXMLNodeSpan owners, std::vector<NSXMLNode*>& candidates) const;
+
+  const Of _of;
+  const NSXMLExpandedNameRef _name;
+  const XQueryValueWay _way;
   const NSXMLValueKey _key;
-  const XQueryShortWalk _walk;
-  const Ref<XQueryExpr> _probe;
+  const Probe _probe;
 };
 
 }  // namespace xquery

@@ -1,26 +1,29 @@
 // Values are looked up in the index of the tree.
 //
-// Pattern     a step child::name, also behind "//", with a predicate K = P or K eq P, on either
-//             side or among others that "and" joins; for $x in such a step without or with
-//             predicates, followed by where K = P, or K = P and more; K leads from the element to
-//             children and attributes of given names
+// Pattern     a step child::name, child::*, descendant::name or //@name, also behind "//", with a
+//             predicate that holds only for what has a certain value (ValueConditions.h); such a
+//             step as the last one of P in "(P)[C]", where C is such a condition, and in "for $x in
+//             P let ... where C"
 // Facts       of the step: all predicates ask for truth, whatever place a node has, and can be
-//             repeated with all steps behind; of P: it is repeatable and does not read the focus;
-//             of a clause: it has neither position nor type, and what it leaves in its variable
-//             cannot be told
+//             repeated with all steps behind; of the value that is asked for: it is repeatable and
+//             does not read the focus; of a clause: it has neither position nor type, what is left
+//             in its variable cannot be told, and let clauses behind it cannot fail
 // Operator    none: the step is told by which key its nodes are found (XQueryValueLookup)
 // Why         untyped values are compared with texts by their texts, and equal texts are what the
-//             index answers; its candidates are asked the condition as before. An element that is
-//             none makes the comparison false, or an error in a predicate, which drops it as well.
-//             With a probe that is no text, and while there is no index, the step walks
+//             index answers; its candidates are asked the condition as before. A node that is none
+//             makes the condition false, or an error in a predicate, which drops it as well. With a
+//             probe that is no text, and while there is no index, the step walks
 #include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/XQueryLeaves.h"
 #include "Plan/Joins/XQueryJoinedSteps.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 #include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/PlaceInside.h"
+#include "Plan/Rules/StepsAround.h"
+#include "Plan/Rules/ValueConditions.h"
 
 #include <memory>
 #include <optional>
@@ -29,7 +32,7 @@
 namespace xquery {
 namespace {
 
-using Lookup = std::unique_ptr<const XQueryValueLookup>;
+using Of = XQueryValueLookup::Of;
 
 class Search {
  public:
@@ -38,6 +41,7 @@ class Search {
   void run() {
     for (XQueryPlaceID place = 0; place < _program.placeCount(); ++place) {
       if (_program[place].expr->kind() == Kind::PathExpr) takePath(place);
+      if (_program[place].role == XQueryRole::FirstStep) takeStart(place);
       if (isa<XQueryFLWORExpr>(_program[place].expr)) takeClause(place);
     }
   }
@@ -47,112 +51,148 @@ class Search {
     XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, place);
     if (!path) return;
     for (XQueryWalkedStep& step : path->changeableSteps()) {
-      const NSXMLExpandedName* element = elementOf(step);
-      if (!element || !step.filtersEach || step.lookup) continue;
+      if (!step.filtersEach) continue;
       for (const XQueryPlaceID predicate : XQueryPredicatesOf(_planning, place, step)) {
-        if (!step.lookup) step.lookup = lookupIn(predicate, *element);
+        if (!takeCondition(predicate, {}, *path, step)) continue;
+        _planning.choose(place);
+        break;
       }
-      if (step.lookup) _planning.choose(place);
     }
   }
 
-  // The last clause, directly before the where clause.
+  // The items of "(P)" that its first predicate keeps. What stands before a position is asked for
+  // truth alone.
+  void takeStart(XQueryPlaceID place) {
+    const XQueryPlace& here = _program[place];
+    if (!here.step || here.step->predicates().empty()) return;
+    const XQueryWalkedPath* around = XQueryWalkedPathAt(_planning, here.parent);
+    const auto predicates = XQueryPredicatesOf(_planning, here.parent, *here.step, 0);
+    if (!around || predicates.empty()) return;
+    // A path puts back the focus that its start leaves.
+    const bool hidesFocus =
+        around->steps().empty() || XQueryHidesFocusOf(*here.step, *around, here.parent, _planning);
+    XQueryWalkedPath* path = hidesFocus ? wholePathAt(place) : nullptr;
+    if (!path || !XQueryPredicatesAreOfTruth(_planning, {predicates.front()})) return;
+    XQueryWalkedStep& last = path->changeableSteps().back();
+    if (takeCondition(predicates.front(), {}, *path, last)) _planning.choose(place);
+  }
+
+  // The last "for" before the where clause, behind which there is nothing but "let".
   void takeClause(XQueryPlaceID place) {
     const XQueryPlaceID where = _program.part(place, XQueryRole::Where);
-    XQueryPlaceID last = XQueryNoPlace;
     if (where == XQueryNoPlace) return;
+    XQueryPlaceID last = XQueryNoPlace;
+    XQueryValueOrigin origin;
+    XQueryVariableSet leftovers = _planning.facts[where].assigns;
+    bool areIdle = true;
     for (XQueryPlaceID part = _program.firstPart(place); part != where;
          part = _program.nextPart(part)) {
-      last = part;
+      if (isa<XQueryForExpr>(_program[part].expr)) {
+        last = part;
+        origin.own = {};
+        areIdle = true;
+      } else {
+        areIdle = areIdle && addLet(part, origin);
+      }
     }
-    const auto* clause =
-        last == XQueryNoPlace ? nullptr : dyn_cast<XQueryForExpr>(_program[last].expr);
-    if (!clause || clause->type() || clause->posVarID() != 0 || clause->varID() == 0) return;
-    XQueryWalkedStep* step = lastStepOf(_program.part(last, XQueryRole::Bound));
-    const NSXMLExpandedName* element = step ? elementOf(*step) : nullptr;
-    if (!element || step->lookup || (step->hasPredicates() && !step->filtersEach)) return;
-    XQueryPlaceID condition = XQueryPlaceInside(_program, where);
-    while (isAnd(condition)) {
-      condition = XQueryPlaceInside(_program, _program.firstPart(condition));
+    const auto* clause = last == XQueryNoPlace ? nullptr : cast<XQueryForExpr>(_program[last].expr);
+    if (!areIdle || !clause || clause->type() || clause->posVarID() != 0 || clause->varID() == 0) {
+      return;
     }
-    Lookup lookup = lookupAt(condition, *element, clause->varID());
-    if (!lookup) return;
-    XQueryVariableSet leftovers = _planning.facts[where].assigns;
+    XQueryWalkedPath* path = wholePathAt(_program.part(last, XQueryRole::Bound));
+    if (!path || !isIdleButForErrors(firstConditionOf(where))) return;
+    origin.varID = clause->varID();
+    origin.errorExcludes = false;
+    leftovers.add(origin.own);
     leftovers.add(clause->varID());
+    XQueryWalkedStep& step = path->changeableSteps().back();
+    if (!conditionFor(where, origin, targetOf(*path, step))) return;
     if (_planning.showsLeftovers(leftovers, place)) {
       return _planning.refuse(last, "a variable that would be left with another item may be read");
     }
-    step->lookup = std::move(lookup);
-    _planning.choose(last);
+    if (takeCondition(where, origin, *path, step)) _planning.choose(last);
   }
 
-  // Of a path that stands there by itself: what is kept from elsewhere is for everybody.
-  XQueryWalkedStep* lastStepOf(XQueryPlaceID bound) const {
+  // A let clause that nobody can tell is not evaluated.
+  bool addLet(XQueryPlaceID part, XQueryValueOrigin& origin) const {
+    const auto* let = dyn_cast<XQueryLetExpr>(_program[part].expr);
+    const XQueryPlaceID bound = _program.part(part, XQueryRole::Bound);
+    if (!let || let->type() || bound == XQueryNoPlace) return false;
+    origin.own.add(let->varID());
+    origin.own.add(_planning.facts[bound].assigns);
+    if (XQueryIsTextOfOne(_planning, bound)) return true;
+    return isIdleButForErrors(bound) && !_planning.facts[bound].does(XQueryDeeds::MayFail);
+  }
+
+  bool isIdleButForErrors(XQueryPlaceID place) const {
+    const XQueryFacts& facts = _planning.facts[place];
+    return facts.isRepeatable() && !facts.does(XQueryDeeds::LoadsDocuments);
+  }
+
+  XQueryPlaceID firstConditionOf(XQueryPlaceID where) const {
+    XQueryPlaceID place = XQueryPlaceInside(_program, where);
+    const auto* both = dyn_cast<XQueryOperatorExpr>(_program[place].expr);
+    while (both && both->operatorType() == XQueryOperatorAnd) {
+      place = XQueryPlaceInside(_program, _program.firstPart(place));
+      both = dyn_cast<XQueryOperatorExpr>(_program[place].expr);
+    }
+    return place;
+  }
+
+  // A path that stands there by itself, all of whose nodes may be asked in any order: what is kept
+  // from elsewhere is for everybody.
+  XQueryWalkedPath* wholePathAt(XQueryPlaceID bound) const {
     const XQueryPlaceID place = XQueryPlaceInside(_program, bound);
-    if (place == XQueryNoPlace || _program[place].expr->kind() != Kind::PathExpr) return nullptr;
+    if (place == XQueryNoPlace) return nullptr;
     XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, place);
     if (!path || path->steps().empty() || path != _planning.exprAt(place).get()) return nullptr;
     for (XQueryPlaceID around = bound; around != place; around = _program.firstPart(around)) {
       if (_planning.isWrapped(around)) return nullptr;
     }
-    return &path->changeableSteps().back();
+    const XQueryWalkedStep& last = path->steps().back();
+    return last.hasPredicates() && !last.filtersEach ? nullptr : path;
   }
 
-  // The name of the elements that the step finds; null where it may find others.
-  static const NSXMLExpandedName* elementOf(const XQueryWalkedStep& step) {
+  // What the step finds.
+  struct Target {
+    Of of = Of::Name;
+    const NSXMLExpandedName* name = nullptr;
+    bool isKnown = false;
+  };
+  static Target targetOf(const XQueryWalkedPath& path, const XQueryWalkedStep& step) {
+    const bool goesDown = step.axis == XQueryAxisChild || step.axis == XQueryAxisDescendant;
+    const bool isBelow = &step != &path.steps().front() && (&step - 1)->absorbsNext;
+    const bool isAttribute = step.axis == XQueryAxisAttribute && isBelow;
+    if (step.lookup || step.testMayRaise || (!goesDown && !isAttribute)) return {};
     const auto* test = dyn_cast<XQueryNameTest>(step.test);
-    if (!test || step.choice || step.testMayRaise || step.axis != XQueryAxisChild) return nullptr;
-    return test->boundName() ? test->boundName() : test->nameWithoutNamespace();
+    if (!test || step.choice) return {Of::AnyName, nullptr, goesDown};
+    const auto* name = test->boundName() ? test->boundName() : test->nameWithoutNamespace();
+    return {goesDown ? Of::Name : Of::Attribute, name, name != nullptr};
   }
 
-  bool isAnd(XQueryPlaceID place) const {
-    const auto* operation = dyn_cast<XQueryOperatorExpr>(_program[place].expr);
-    return operation && operation->operatorType() == XQueryOperatorAnd;
+  std::optional<XQueryValueCondition> conditionFor(XQueryPlaceID condition,
+                                                   const XQueryValueOrigin& origin,
+                                                   const Target& target) const {
+    if (!target.isKnown) return std::nullopt;
+    auto found = XQueryValueConditionIn(_planning, condition, origin);
+    if (!found) return std::nullopt;
+    const XQueryValueWay& way = found->way;
+    const bool fits =
+        target.of == Of::Name ||
+        (target.of == Of::Attribute ? way.isEmpty() : !way.isEmpty() && way.isOfChildren());
+    return fits ? std::move(found) : std::nullopt;
   }
 
-  // The first comparison in a predicate that can be looked up. An error in any other drops the
-  // element as well.
-  Lookup lookupIn(XQueryPlaceID predicate, const NSXMLExpandedName& element) const {
-    const XQueryPlaceID place = XQueryPlaceInside(_program, predicate);
-    if (!isAnd(place)) return lookupAt(place, element, 0);
-    for (XQueryPlaceID part = _program.firstPart(place); part != XQueryNoPlace;
-         part = _program.nextPart(part)) {
-      if (Lookup found = lookupAt(XQueryPlaceInside(_program, part), element, 0)) return found;
-    }
-    return nullptr;
-  }
-
-  // `varID` is the variable that holds the element; 0: it is the context item.
-  Lookup lookupAt(XQueryPlaceID place, const NSXMLExpandedName& element, int64_t varID) const {
-    const auto* comparison = dyn_cast<XQueryOperatorExpr>(_program[place].expr);
-    if (!comparison) return nullptr;
-    const int type = comparison->operatorType();
-    // Outside of a predicate a value comparison of several values is an error to be seen.
-    const bool isEquality = type == XQueryOperatorEqual || (type == XQueryOperatorEq && varID == 0);
-    const XQueryPlaceID left = _program.firstPart(place);
-    const XQueryPlaceID right = left == XQueryNoPlace ? left : _program.nextPart(left);
-    if (!isEquality || right == XQueryNoPlace) return nullptr;
-    if (XQueryOperatorExpr::rangeIn(comparison->right())) return nullptr;
-    Lookup found = lookupOf(left, right, element, varID);
-    return found ? std::move(found) : lookupOf(right, left, element, varID);
-  }
-
-  Lookup lookupOf(XQueryPlaceID key, XQueryPlaceID probe, const NSXMLExpandedName& element,
-                  int64_t varID) const {
-    XQueryShortWalk walk;
-    if (!walk.readFrom(*_program[key].expr) || walk.variable() != varID) return nullptr;
-    auto names = walk.valueKey(element);
-    if (!names) return nullptr;
-    const XQueryFacts& facts = _planning.facts[probe];
-    XQueryVariableSet item;
-    item.add(varID);
-    const bool isOpen = facts.isRepeatable() && !facts.does(XQueryDeeds::ReadsFocus) &&
-                        !facts.does(XQueryDeeds::LoadsDocuments) && facts.assigns.isEmpty() &&
-                        (varID == 0 || !facts.reads.meets(item)) &&
-                        facts.mayBe(XQueryItems::Node | XQueryItems::Untyped | XQueryItems::String);
-    if (!isOpen) return nullptr;
-    return std::make_unique<const XQueryValueLookup>(*std::move(names), walk,
-                                                     _planning.exprAt(probe));
+  // Tells the step to look up what can meet the condition.
+  bool takeCondition(XQueryPlaceID condition, const XQueryValueOrigin& origin,
+                     const XQueryWalkedPath& path, XQueryWalkedStep& step) const {
+    const Target target = targetOf(path, step);
+    const auto found = conditionFor(condition, origin, target);
+    if (!found) return false;
+    step.lookup = std::make_unique<const XQueryValueLookup>(
+        target.of, target.name, found->way,
+        XQueryValueLookup::Probe{found->probe, found->meetsNoneWhenEmpty});
+    return true;
   }
 
   XQueryPlanning& _planning;

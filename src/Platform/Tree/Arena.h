@@ -218,6 +218,14 @@ class NSXMLTree : public NSXMLTreeHead {
     }
     return nullptr;
   }
+  // The node at which the descendant axis of queries ends: the next sibling or, without one, the
+  // parent's. Null lets it run to the end of the tree, past the subtree of the node when that is the
+  // last child of a last child.
+  static NSXMLNode* descendantStop(const NSXMLNode* node) {
+    if (NSXMLNode* sibling = node->nextSibling()) return sibling;
+    const NSXMLNode* parent = node->parent();
+    return parent ? parent->nextSibling() : nullptr;
+  }
   static void setOrderNumber(NSXMLNode* node, uint32_t number) { node->_word = number; }
   static void setCDATA(NSXMLNode* node) { node->_flags |= NSXMLNode::CDATA; }
   static bool isCDATA(const NSXMLNode* node) { return (node->_flags & NSXMLNode::CDATA) != 0; }

@@ -131,9 +131,27 @@ const NSXMLValueIndex* NSXMLTreeIndexes::values(const NSXMLValueKey& key, uint64
   if (present || !isWorth(place->workDone, work)) return present;
   const NSXMLNameIndex* const names = makeElements();
   if (!names) return nullptr;
+  if (!key.element) return makeOfOwners(*place, *names);
   const NSXMLNodeSpan elements = names->nodes(key.element.get());
   return makeOnce(*place, NSXMLValueIndex::likelyBytes(elements.size()),
-                  [&] { return NSXMLValueIndex::make(elements, key); });
+                  [&] { return NSXMLValueIndex::make(elements, key, *names); });
+}
+
+// Of the elements that have the attribute.
+const NSXMLValueIndex* NSXMLTreeIndexes::makeOfOwners(KeyPlace& place,
+                                                      const NSXMLNameIndex& names) {
+  const NSXMLNameIndex* const all = attributes(_lastNumber);
+  if (!all) return nullptr;
+  const NSXMLNodeSpan found = all->nodes(place.key.attribute.get());
+  return makeOnce(place, NSXMLValueIndex::likelyBytes(found.size()), [&] {
+    NSXMLIndexList<NSXMLNode*> owners;
+    WorkPacer pacer;
+    for (const NSXMLNode* attribute : found) {
+      pacer.turn();
+      owners.push_back(attribute->parent());
+    }
+    return NSXMLValueIndex::make(owners, place.key, names);
+  });
 }
 
 void NSXMLTreeIndexes::addWork(const NSXMLValueKey& key, uint64_t work) {
@@ -208,7 +226,7 @@ NSXMLIndexedValues NSXMLIndexedValues::of(const NSXMLValueKey& key, const NSXMLN
                                           const NSXMLNode* stop) {
   IndexesForWalk walk = indexesForWalk(first, stop);
   const NSXMLValueIndex* const values = walk.indexes ? walk.indexes->values(key, 0) : nullptr;
-  return {std::move(walk.indexes), values};
+  return {std::move(walk.indexes), values && values->isGivenUp() ? nullptr : values};
 }
 
 void NSXMLNoteAskedValues(const NSXMLValueKey& key, uint64_t elements, const NSXMLNode* node) {

@@ -109,6 +109,7 @@ class NSXMLTreeIndexes {
   template <class Index, class Make>
   const Index* makeOnce(Place<Index>& place, size_t bytes, Make make);
   const NSXMLNameIndex* makeElements();
+  const NSXMLValueIndex* makeOfOwners(KeyPlace& place, const NSXMLNameIndex& names);
   KeyPlace* placeOf(const NSXMLValueKey& key);
 
   std::atomic<uint32_t> _references = 1;

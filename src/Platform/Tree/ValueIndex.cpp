@@ -30,29 +30,58 @@ class StringValue {
   NSStringView _view;
 };
 
-// Calls `visit` with each node that the key leads to from the element, in document order, going
-// down from step `at` on. The steps are as many as somebody wrote.
+// Goes from an element to each node that the key leads to, in document order where no step leads to
+// descendants, as long as `visit` answers true.
 template <class Visit>
-void forEachValue(const NSXMLNode* element, const NSXMLValueKey& key, size_t at, WorkPacer& pacer,
-                  Visit& visit) {
-  if (at < key.children.size()) {
-    const NSXMLExpandedName* const name = key.children[at].get();
+class ValueWalk {
+ public:
+  ValueWalk(const NSXMLValueKey& key, const NSXMLNameIndex& names, Visit visit)
+      : _key(key), _names(names), _visit(visit) {}
+
+  // Going down from step `at` on. The steps are as many as somebody wrote.
+  bool walk(const NSXMLNode* element, size_t at = 0) {
+    if (at == _key.steps.size()) return visitValues(element);
+    const NSXMLValueStep& step = _key.steps[at];
+    const NSXMLExpandedName* const name = step.name.get();
+    if (step.isToDescendants) return walkDescendants(element, at);
     for (const NSXMLNode* child = element->firstChild(); child; child = child->nextSibling()) {
-      pacer.turn();
-      if (child->kind() == Kind::Element && child->expandedName() == name) {
-        forEachValue(child, key, at + 1, pacer, visit);
-      }
+      _pacer.turn();
+      const bool isNamed = child->kind() == Kind::Element && child->expandedName() == name;
+      if (isNamed && !walk(child, at + 1)) return false;
     }
-    return;
+    return true;
   }
-  const NSXMLExpandedName* const name = key.attribute.get();
-  if (!name) return visit(element);
-  for (const NSXMLNode* attribute = cast<NSXMLElement>(element)->firstAttribute(); attribute;
-       attribute = NSXMLElement::nextAttribute(attribute)) {
-    pacer.turn();
-    if (attribute->expandedName() == name) visit(attribute);
+
+ private:
+  bool walkDescendants(const NSXMLNode* element, size_t at) {
+    const NSXMLNode* const first = element->nextNode();
+    const NSXMLNode* const stop = NSXMLTree::descendantStop(element);
+    if (!first || first == stop) return true;
+    const auto found =
+        NSXMLNameIndex::between(_names.nodes(_key.steps[at].name.get()), first, stop);
+    for (const NSXMLNode* each : found) {
+      _pacer.turn();
+      if (!walk(each, at + 1)) return false;
+    }
+    return true;
   }
-}
+
+  bool visitValues(const NSXMLNode* element) {
+    const NSXMLExpandedName* const name = _key.attribute.get();
+    if (!name) return _visit(element);
+    for (const NSXMLNode* attribute = cast<NSXMLElement>(element)->firstAttribute(); attribute;
+         attribute = NSXMLElement::nextAttribute(attribute)) {
+      _pacer.turn();
+      if (attribute->expandedName() == name && !_visit(attribute)) return false;
+    }
+    return true;
+  }
+
+  const NSXMLValueKey& _key;
+  const NSXMLNameIndex& _names;
+  Visit _visit;
+  WorkPacer _pacer;
+};
 
 }  // namespace
 
@@ -60,9 +89,7 @@ bool operator==(const NSXMLValueKey& a, const NSXMLValueKey& b) {
   const auto isSame = [](const NSXMLExpandedNameRef& x, const NSXMLExpandedNameRef& y) {
     return x.get() == y.get();
   };
-  return isSame(a.element, b.element) && isSame(a.attribute, b.attribute) &&
-         std::equal(a.children.begin(), a.children.end(), b.children.begin(), b.children.end(),
-                    isSame);
+  return isSame(a.element, b.element) && isSame(a.attribute, b.attribute) && a.steps == b.steps;
 }
 
 size_t NSXMLValueIndex::placeOf(NSStringView value, uint32_t hash) const {
@@ -147,13 +174,29 @@ std::unique_ptr<const NSXMLValueIndex> NSXMLValueIndex::Maker::index() {
 }
 
 std::unique_ptr<const NSXMLValueIndex> NSXMLValueIndex::make(NSXMLNodeSpan elements,
-                                                             const NSXMLValueKey& key) {
+                                                             const NSXMLValueKey& key,
+                                                             const NSXMLNameIndex& names) {
+  // Some elements may have several values; if all of them have many, they lie in each other.
+  constexpr size_t fewValues = 1024;
+  constexpr size_t mostValuesOfEach = 8;
+  size_t valuesLeft = fewValues + mostValuesOfEach * elements.size();
+  const bool goesDown = std::any_of(key.steps.begin(), key.steps.end(),
+                                    [](const auto& step) { return step.isToDescendants; });
   Maker maker;
   WorkPacer pacer;
-  for (NSXMLNode* element : elements) {
+  NSXMLNode* element = nullptr;
+  ValueWalk walk(key, names, [&](const NSXMLNode* value) {
+    maker.add(element, value);
+    return !goesDown || --valuesLeft > 0;
+  });
+  for (NSXMLNode* each : elements) {
     pacer.turn();
-    const auto add = [&](const NSXMLNode* value) { maker.add(element, value); };
-    forEachValue(element, key, 0, pacer, add);
+    element = each;
+    if (walk.walk(each)) continue;
+    std::unique_ptr<NSXMLValueIndex> nothing(new NSXMLValueIndex);
+    nothing->growTable();
+    nothing->_isGivenUp = true;
+    return nothing;
   }
   return maker.index();
 }

@@ -1,5 +1,5 @@
 // The elements of one name by a value that belongs to them: an attribute of their own, the text of
-// a child, an attribute of a grandchild and so on.
+// a child, an attribute of a grandchild, the text of a descendant and so on.
 //
 //   for item, seller/@person      <item><seller person="p1"/><seller person="p2"/></item>
 //                                 is found by "p1" and by "p2"
@@ -8,32 +8,53 @@
 // units are. An element may have several values, one of them twice, or none: it is found once by
 // each. Texts are not copied: a value is known by the first node that has it.
 //
-// As a name index, it is made in one pass, never changes and is of the tree as it was.
+// As a name index, it is made in one pass, never changes and is of the tree as it was. Where
+// elements lie in each other, each has the values of all below it: an index that would become much
+// larger than what it is made from is given up.
 #pragma once
 
 #include "Platform/Tree/NameIndex.h"
 
+#include <memory>
+#include <utility>
 #include <vector>
 
 namespace xquery {
 
+// A step down to elements of a name.
+struct NSXMLValueStep {
+  NSXMLValueStep(NSXMLExpandedNameRef ofName, bool toDescendants = false)
+      : name(std::move(ofName)), isToDescendants(toDescendants) {}
+
+  NSXMLExpandedNameRef name;
+  bool isToDescendants;  // as the axis finds them: up to `descendantStop`; else children
+
+  friend bool operator==(const NSXMLValueStep& a, const NSXMLValueStep& b) {
+    return a.name.get() == b.name.get() && a.isToDescendants == b.isToDescendants;
+  }
+};
+
 // Which elements, and the way from each to its values.
 struct NSXMLValueKey {
-  NSXMLExpandedNameRef element;
-  std::vector<NSXMLExpandedNameRef> children;  // the names of the steps down; none: the element
-  NSXMLExpandedNameRef attribute;  // of what the steps lead to; null for its own string value
+  NSXMLExpandedNameRef
+      element;  // null for those of any name that have the attribute, without steps
+  std::vector<NSXMLValueStep> steps;  // none: the element
+  NSXMLExpandedNameRef attribute;     // of what the steps lead to; null for its own string value
 
   friend bool operator==(const NSXMLValueKey& a, const NSXMLValueKey& b);
 };
 
 class NSXMLValueIndex {
  public:
-  // The elements that the key names, in document order.
+  // The elements that the key names, in document order; `names` are the elements of the tree.
   [[nodiscard]] static std::unique_ptr<const NSXMLValueIndex> make(NSXMLNodeSpan elements,
-                                                                   const NSXMLValueKey& key);
+                                                                   const NSXMLValueKey& key,
+                                                                   const NSXMLNameIndex& names);
   // What making one is likely to take at most, for so many elements: few have several values.
   static size_t likelyBytes(size_t elements) { return elements * bytesPerElement; }
 
+  // Whether it has been given up: it knows nothing.
+  bool isGivenUp() const { return _isGivenUp; }
   // The elements that have the value, in document order.
   NSXMLNodeSpan nodes(NSStringView value) const;
   // How many different values there are.
@@ -60,6 +81,7 @@ class NSXMLValueIndex {
   NSXMLIndexList<uint32_t> _table;  // numbers of values; 2^n places, at most half of them taken
   NSXMLIndexList<KnownValue> _values;
   NSXMLIndexList<NSXMLNode*> _nodes;
+  bool _isGivenUp = false;
 };
 
 }  // namespace xquery

@@ -10,6 +10,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <atomic>
 #include <functional>
 #include <map>
@@ -153,13 +154,16 @@ TEST(XMLNameIndex, HoldsAsManyNamesAsTheTreeHas) {
 
 Nodes valuesOf(NSXMLNode* element, const NSXMLValueKey& key) {
   Nodes at{element};
-  for (const auto& step : key.children) {
+  for (const NSXMLValueStep& step : key.steps) {
     Nodes below;
     for (const NSXMLNode* node : at) {
-      for (NSXMLNode* child = node->firstChild(); child; child = child->nextSibling()) {
-        if (child->kind() == Kind::Element && child->expandedName() == step.get()) {
-          below.push_back(child);
+      const NSXMLNode* const stop = NSXMLTree::descendantStop(node);
+      NSXMLNode* each = step.isToDescendants ? node->nextNode() : node->firstChild();
+      while (each && each != stop) {
+        if (each->kind() == Kind::Element && each->expandedName() == step.name.get()) {
+          below.push_back(each);
         }
+        each = step.isToDescendants ? each->nextNode() : each->nextSibling();
       }
     }
     at.swap(below);
@@ -194,6 +198,8 @@ const NSXMLValueKey someKeys[] = {
     {name("r"), {name("a"), name("b")}, name("x")},
     {name("a", "urn:n"), {name("a"), name("b"), name("c")}, {}},
     {name("none"), {name("a")}, {}},
+    {name("a"), {{name("b"), true}}, name("x")},
+    {name("r"), {name("a"), {name("c"), true}}, {}},
 };
 
 void expectValues(const NSXMLValueIndex& index, NSXMLNode* root, const NSXMLValueKey& key) {
@@ -212,7 +218,7 @@ TEST(XMLValueIndex, HasWhatAWalkFinds) {
     const auto document = parsed(Records(seed).text(seed * 20));
     const auto names = NSXMLNameIndex::ofElements(document.get());
     for (const NSXMLValueKey& key : someKeys) {
-      const auto index = NSXMLValueIndex::make(names->nodes(key.element.get()), key);
+      const auto index = NSXMLValueIndex::make(names->nodes(key.element.get()), key, *names);
       expectValues(*index, document.get(), key);
     }
   }
@@ -222,11 +228,46 @@ TEST(XMLValueIndex, FindsAnElementOnceByEachOfItsValues) {
   const auto document = parsed("<r><i><s p='1'/><s p='2'/><s p='1'/></i><i><s p='2'/><s/></i></r>");
   const NSXMLValueKey key{name("i"), {name("s")}, name("p")};
   const auto names = NSXMLNameIndex::ofElements(document.get());
-  const auto index = NSXMLValueIndex::make(names->nodes(key.element.get()), key);
+  const auto index = NSXMLValueIndex::make(names->nodes(key.element.get()), key, *names);
   NSXMLNode* first = document->rootElement()->firstChild();
   EXPECT_EQ(listed(index->nodes(A("1"))), Nodes{first});
   EXPECT_EQ(listed(index->nodes(A("2"))), (Nodes{first, first->nextSibling()}));
   EXPECT_TRUE(index->nodes(A("")).empty());
+}
+
+// Each of them would have the values of all the others below it.
+TEST(XMLValueIndex, IsGivenUpWhereElementsLieInEachOther) {
+  const NSXMLValueKey key{name("e"), {{name("e"), true}}, {}};
+  for (const size_t count : {10, 2000}) {
+    const auto root = NSXMLElement::elementWithName(A("e"));
+    NSXMLElement* inner = root.get();
+    for (size_t i = 1; i < count; ++i) {
+      const auto element = NSXMLElement::elementWithName(A("e"));
+      inner->addChild(element);
+      inner = element.get();
+    }
+    const auto names = NSXMLNameIndex::ofElements(root.get());
+    const auto index = NSXMLValueIndex::make(names->nodes(key.element.get()), key, *names);
+    EXPECT_EQ(index->isGivenUp(), count > 1000);
+    EXPECT_EQ(index->nodes(A("")).size(), count > 1000 ? 0 : count - 1);
+  }
+}
+
+TEST(XMLTreeIndexes, FindOwnersByTheirAttributes) {
+  const auto document = parsed(Records(7).text(500));
+  const auto indexes = NSXMLTreeIndexes::of(document.get());
+  const NSXMLValueKey key{{}, {}, name("x")};
+  const NSXMLValueIndex* index = nullptr;
+  for (int turn = 0; turn < 4 && !index; ++turn) index = indexes->values(key, wholeWalk);
+  ASSERT_TRUE(index);
+  size_t count = 0;
+  for (NSXMLNode* each : walked(Kind::Attribute, name("x").get(), document.get(), nullptr)) {
+    const auto owners = listed(index->nodes(each->stringValue()->view()));
+    EXPECT_TRUE(std::find(owners.begin(), owners.end(), each->parent()) != owners.end());
+    ++count;
+  }
+  EXPECT_GT(count, 0u);
+  EXPECT_TRUE(index->nodes(A("no such value")).empty());
 }
 
 TEST(XMLValueIndex, ValuesMadeToMeetInAnUnkeyedHashTakeTimeInProportionToThem) {
@@ -242,7 +283,7 @@ TEST(XMLValueIndex, ValuesMadeToMeetInAnUnkeyedHashTakeTimeInProportionToThem) {
     const auto names = NSXMLNameIndex::ofElements(root.get());
     const NSXMLNodeSpan elements = names->nodes(key.element.get());
     return processorSecondsOf(
-        [&] { EXPECT_EQ(NSXMLValueIndex::make(elements, key)->valueCount(), count); });
+        [&] { EXPECT_EQ(NSXMLValueIndex::make(elements, key, *names)->valueCount(), count); });
   };
   EXPECT_TRUE(growsInProportion(seconds, 8000));
 }

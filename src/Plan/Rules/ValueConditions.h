@@ -1,0 +1,39 @@
+// Conditions that hold only for what has a certain value.
+#pragma once
+
+#include "Plan/Paths/XQueryValueWay.h"
+#include "Plan/Planning.h"
+
+#include <optional>
+
+namespace xquery {
+
+// The condition holds only where the way leads to a value that equals the probe.
+struct XQueryValueCondition {
+  XQueryValueWay way;
+  Ref<XQueryExpr> probe;            // repeatable, does not read the focus
+  bool meetsNoneWhenEmpty = false;  // or where it leads to none and the probe is the empty text
+};
+
+// Whose values a condition asks for.
+struct XQueryValueOrigin {
+  int64_t varID = 0;      // the variable that holds it; 0: the context item
+  XQueryVariableSet own;  // variables that let clauses set for it
+  // An error in the condition excludes the node, too. Otherwise there is none for those that are
+  // excluded.
+  bool errorExcludes = true;
+};
+
+// Finds such a condition among what has to hold for this one: in "K = P" and "K eq P", on either
+// side and joined with others by "and"; "some $k in K satisfies $k = P"; "K[. = P]" where its truth
+// is asked for, or whether it is there, also by exists, boolean, not(empty(...)) and count(...) >
+// 0, and as "for $k in K where $k = P return ..."; and in the body of a declared function. K may be
+// passed through string() or data(), or through a variable that a let clause sets.
+std::optional<XQueryValueCondition> XQueryValueConditionIn(const XQueryPlanning& planning,
+                                                           XQueryPlaceID condition,
+                                                           const XQueryValueOrigin& origin);
+
+// Whether the place is string() or data() of one node at most, which cannot fail.
+bool XQueryIsTextOfOne(const XQueryPlanning& planning, XQueryPlaceID place);
+
+}  // namespace xquery
