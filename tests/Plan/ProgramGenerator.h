@@ -97,7 +97,10 @@ class ProgramGenerator {
       case 10:
         return "[" + computedPosition(depth) + "]";
       case 0:
-        return "[" + _random.oneOf({"1", "2", "last()", "position() < 3", "position() = 1"}) + "]";
+        return "[" +
+               _random.oneOf({"1", "2", "last()", "last() - 1", "position() = last()",
+                              "position() < 3", "position() = 1"}) +
+               "]";
       case 1:
         return "[" +
                _random.oneOf({"@x", "b", "c/a", "not(@y)", "b and @x", "not(a or @y = 1)",
@@ -352,8 +355,9 @@ class ProgramGenerator {
     }
     if (_random.below(5) == 0) {
       return "(" + path(depth - 1) + ")" +
-             _random.oneOf(
-                 {"[1]", "[2]", "[position() <= 2]", "[position() < 2]", "[3 >= position()]"});
+             _random.oneOf({"[1]", "[2]", "[position() <= 2]", "[position() < 2]",
+                            "[3 >= position()]", "[last()]", "[last() - 1]", "[last() - 1]/..",
+                            "[position() eq last()]"});
     }
     return functions[_random.below(functions.size())] + "(" + expr(depth - 1) + ")";
   }

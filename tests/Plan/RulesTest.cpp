@@ -519,6 +519,59 @@ TEST(TakePositions, TakesNumbersThatAreTheSameForAllNodes) {
   }
 }
 
+// Children are walked from the last; of other nodes and items there is a list.
+TEST(TakePositions, CountsFromTheBack) {
+  for (const char* text : {"//a[last()]",
+                           "//a/b[last()]/@y",
+                           "/r/a[last() - 1]",
+                           "//c/b[position() = last()]",
+                           "//a/*[last() - 1 eq position()]",
+                           "/r/node()[(last())]",
+                           "//a/b[last() - 5]",
+                           "//none[last()]",
+                           "//a/text()[last()]",
+                           "//a[b][last()]/@x",
+                           "//a/b[last()][@y]",
+                           "//a/b[last()][1]",
+                           "//a/b[last()][last()]",
+                           "/r/*[self::a][last()]",
+                           "//b/@*[last()]",
+                           "//c/ancestor::*[last()]",
+                           "//b/preceding-sibling::*[last() - 1]",
+                           "/r//b[last()]",
+                           "/descendant::b[last()]",
+                           "(//a)[last()]",
+                           "(//b)[last() - 3]/..",
+                           "(//a, 1)[last()]",
+                           "(//a/b, 1)[position() = last()]",
+                           "()[last()]",
+                           "(1)[last() - 0]",
+                           "(1)[last() - 1]",
+                           "(//b)[@y][last()]",
+                           "let $l := (//b, 'x') return $l[last() - 1]",
+                           "let $l := //b return ($l[last()]/.., count($l[last()]))",
+                           "count(//a/b[last()])",
+                           "exists(//a[last() - 1])",
+                           "(//a/b[last()])[1]",
+                           "for $a in //a return $a/b[last()]",
+                           "//a/(b)[last()]",
+                           "//a[b[last()]/@y = 2]",
+                           "(//a, 1)[last()][. = 1]",
+                           "(//a)[last()]/last()"}) {
+    EXPECT_GE(choicesOf("positions", text), 1U) << text;
+    resultOf(text, names());
+    resultOf(text, manyNames());
+  }
+  for (const char* text :
+       {"//a[last() + 1]", "//a[last() - 1.5]", "//a[last() - @x]", "//a[last(1)]",
+        "//a[position() != last()]", "//a[position() = last() - -1]", "(//a, 1)[last()]/b",
+        "//a[(last(), 1)]", "//a[last() = 1]", "//a[not(last())]"}) {
+    EXPECT_EQ(choicesOf("positions", text), 0U) << text;
+    resultOf(text, names());
+    resultOf(text, manyNames());
+  }
+}
+
 // A recursion that ends where there are no nodes.
 TEST(TakePositions, AsksNothingWithoutNodes) {
   const char* text =

@@ -233,6 +233,13 @@ bool XQueryPathWalk::filterNodes(const XQueryWalkedStep& step, size_t fromIndex,
                                  std::vector<NSXMLNode*>& nodes) {
   const auto& predicates = step.step->predicates();
   for (size_t index = fromIndex; index < predicates.size(); ++index) {
+    if (index == step.fromBack.predicate) {
+      const uint64_t behind = step.fromBack.behind;
+      const bool isThere = behind < nodes.size();
+      if (isThere) nodes[0] = nodes[nodes.size() - 1 - behind];
+      nodes.resize(isThere ? 1 : 0);
+      continue;
+    }
     const XQueryNodeQuestion* question =
         step.step->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicates[index].get());
     if (!question) return step.step->filterNodes(nodes, index, context);
@@ -335,7 +342,8 @@ void XQueryPathWalk::filter(size_t index, int axis, NSXMLNode* node) {
 }
 
 // Gathers the step's nodes along the axis, nearest first for a reverse axis. Answers how many
-// predicates are dealt with: the walk stops at the node that a literal position asks for.
+// predicates are dealt with: the walk stops at the node that a literal position asks for, and among
+// children begins at the end where the position is counted from there.
 size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
                                std::vector<NSXMLNode*>& nodes) {
   XQueryStepTest test(step, *this);
@@ -353,6 +361,11 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
   }
   if (step.computedPosition == first && !listingStep && !step.testMayRaise) {
     collectComputed(step, axis, node, nodes);
+    return first + 1;
+  }
+  const bool isFromBack = step.fromBack.predicate == first && axis == XQueryAxisChild;
+  if (isFromBack && !listingStep && !step.testMayRaise) {
+    collectFromBack(step, node, nodes);
     return first + 1;
   }
   const auto walk = [&](auto visit) {
@@ -389,6 +402,19 @@ void XQueryPathWalk::collectComputed(const XQueryWalkedStep& step, int axis, NSX
     return false;
   });
   hasFailed = hasFailed || context._internal().isFailing();
+}
+
+void XQueryPathWalk::collectFromBack(const XQueryWalkedStep& step, const NSXMLNode* node,
+                                     std::vector<NSXMLNode*>& nodes) {
+  XQueryStepTest test(step, *this);
+  uint64_t left = step.fromBack.behind + 1;
+  const auto visit = [&](NSXMLNode* found) {
+    if (!test.matches(found) || --left > 0) return true;
+    nodes.push_back(found);
+    return false;
+  };
+  NSXMLNode* last = node->lastChild();
+  if (last && visit(last)) XQueryWalkPrecedingSiblings(last, visit);
 }
 
 }  // namespace xquery

@@ -90,6 +90,8 @@ class XQueryPathWalk : public XQueryPathRun {
                  std::vector<NSXMLNode*>& nodes);
   void collectComputed(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
                        std::vector<NSXMLNode*>& nodes);
+  void collectFromBack(const XQueryWalkedStep& step, const NSXMLNode* node,
+                       std::vector<NSXMLNode*>& nodes);
   bool filtersEach(const XQueryWalkedStep& step) const;
   bool keepsAlone(const XQueryWalkedStep& step, size_t firstPredicate, NSXMLNode* node);
   bool filterNodes(const XQueryWalkedStep& step, size_t fromIndex, std::vector<NSXMLNode*>& nodes);

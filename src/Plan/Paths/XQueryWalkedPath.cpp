@@ -44,6 +44,15 @@ Value keptItems(const Value& items, const XQueryExpr& predicate, const XQueryNod
   return kept.value();
 }
 
+// As a predicate keeps it that asks for that position.
+Value itemFromBack(const Value& items, uint64_t behind) {
+  const XQueryItemList list(items.get());
+  XQueryGatherer kept;
+  NSObject* item = behind < list.count() ? list[list.count() - 1 - behind] : nullptr;
+  if (item && item->kind() != Kind::Null) kept.add(item);
+  return kept.value();
+}
+
 }  // namespace
 
 XQueryWalkedPath::XQueryWalkedPath(Ref<XQueryExpr> plain, Ref<XQueryPathExpr> path)
@@ -189,6 +198,11 @@ Value XQueryWalkedPath::evaluateStart(XQueryContext& context,
   size_t index = 0;
   for (const auto& predicate : _start->predicates()) {
     if (!items) break;  // there is no context item
+    if (index == _startFromBack.predicate) {
+      items = itemFromBack(items, _startFromBack.behind);
+      ++index;
+      continue;
+    }
     const auto* question =
         _start->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicate.get());
     if (!question) break;

@@ -72,6 +72,8 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
     bool findsInOrder = false;
   };
   std::vector<XQueryWalkedStep>& changeableSteps() { return _steps; }
+  // That of the start.
+  XQueryFromBack& startFromBack() { return _startFromBack; }
   void setFindings(const Findings& findings) {
     _trailCount = findings.trailCount;
     _countsNodes = findings.countsNodes;
@@ -97,6 +99,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
 
   const Ref<XQueryPathExpr> _path;
   const XQueryStep* _start = nullptr;
+  XQueryFromBack _startFromBack;
   std::vector<XQueryWalkedStep> _steps;
   bool _hasPredicates = false;
   std::unique_ptr<const XQueryPicker> _picker;

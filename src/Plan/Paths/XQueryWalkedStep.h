@@ -8,10 +8,18 @@
 #include "Plan/Paths/XQueryValueLookup.h"
 
 #include <cstddef>
+#include <cstdint>
 #include <memory>
 #include <utility>
 
 namespace xquery {
+
+// The predicate of a step that asks for a position counted from the back.
+struct XQueryFromBack {
+  static constexpr size_t noPredicate = SIZE_MAX;
+  size_t predicate = noPredicate;
+  uint64_t behind = 0;  // the number of items behind the one that is asked for
+};
 
 struct XQueryWalkedStep {
   static constexpr size_t noTrail = SIZE_MAX;
@@ -76,6 +84,7 @@ struct XQueryWalkedStep {
   // The predicate that is a number, the same for all nodes; noPredicate for none.
   static constexpr size_t noPredicate = SIZE_MAX;
   size_t computedPosition = noPredicate;
+  XQueryFromBack fromBack;
   size_t trail = noTrail;
 };
 

@@ -12,11 +12,32 @@
 #include <utility>
 
 namespace xquery {
+namespace {
 
-bool XQueryIsPosition(const XQueryExpr* expr) {
+bool isCallWithoutArguments(const XQueryExpr* expr, XQueryProcedure function) {
   const auto* call = dyn_cast<XQueryFunctionCall>(XQueryWithoutParentheses(expr));
   const size_t count = call && call->args() ? call->args()->count() : 0;
-  return call && call->builtIn() && call->function() == fn_position && count == 0;
+  return call && call->builtIn() && call->function() == function && count == 0;
+}
+
+// Of "last()" and "last() - 1".
+std::optional<uint64_t> takenFromLast(const XQueryExpr* expr) {
+  if (isCallWithoutArguments(expr, fn_last)) return 0;
+  const auto* difference = dyn_cast<XQueryOperatorExpr>(XQueryWithoutParentheses(expr));
+  if (!difference || difference->operatorType() != XQueryOperatorMinus) return std::nullopt;
+  if (!isCallWithoutArguments(difference->left(), fn_last)) return std::nullopt;
+  const auto number = XQuerySmallIntegerIn(difference->right());
+  return number && *number >= 0 ? std::optional(static_cast<uint64_t>(*number)) : std::nullopt;
+}
+
+bool isEquality(int type) {
+  return type == XQueryOperatorEqual || type == XQueryOperatorEq;
+}
+
+}  // namespace
+
+bool XQueryIsPosition(const XQueryExpr* expr) {
+  return isCallWithoutArguments(expr, fn_position);
 }
 
 std::optional<int64_t> XQuerySmallIntegerIn(const XQueryExpr* expr) {
@@ -54,6 +75,13 @@ std::optional<XQueryPositionCondition> XQueryPositionConditionIn(const XQueryExp
   const auto number = XQuerySmallIntegerIn(isOnLeft ? comparison->right() : comparison->left());
   if (!number) return std::nullopt;
   return XQueryPositionCondition{isOnLeft ? type : XQueryMirroredComparison(type), *number};
+}
+
+std::optional<uint64_t> XQueryItemsBehindAskedFor(const XQueryExpr& predicate) {
+  const auto* comparison = dyn_cast<XQueryOperatorExpr>(XQueryWithoutParentheses(&predicate));
+  if (!comparison || !isEquality(comparison->operatorType())) return takenFromLast(&predicate);
+  if (XQueryIsPosition(comparison->left())) return takenFromLast(comparison->right());
+  return XQueryIsPosition(comparison->right()) ? takenFromLast(comparison->left()) : std::nullopt;
 }
 
 }  // namespace xquery

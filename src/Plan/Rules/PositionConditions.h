@@ -24,4 +24,8 @@ struct XQueryPositionCondition {
 };
 std::optional<XQueryPositionCondition> XQueryPositionConditionIn(const XQueryExpr& expr);
 
+// "last()", "last() - 1", "position() = last() - 1" as a predicate: how many items stand behind the
+// one that is asked for.
+std::optional<uint64_t> XQueryItemsBehindAskedFor(const XQueryExpr& predicate);
+
 }  // namespace xquery

@@ -1,13 +1,16 @@
 // Positions that a step could have been asked for by number.
 //
-// Pattern     a[position() = 3], a[3 eq position()]; a[$i + 1]
+// Pattern     a[position() = 3], a[3 eq position()]; a[$i + 1]; a[last()], (//a)[last() - 1],
+//             $l[position() = last()]
 // Facts       the number is an integer, 1 or more, or an expression that answers nothing else,
 //             reads no focus and is repeatable; nothing shows the focus that the predicate leaves
 //             (StepsAround.h)
 // Operator    none: the predicate is the number, so that the step walks no further than that; an
-//             expression is evaluated once for the nodes of the step and not for each of them
-// Why         a number in a predicate asks for that position; without nodes it is not evaluated
-//             and an error in it drops each of them
+//             expression is evaluated once for the nodes of the step and not for each of them; what
+//             is counted from the back is taken from there, and children are walked from the last
+// Why         a number in a predicate asks for that position; without nodes it is not evaluated,
+//             and an error in it drops each of them; "last()" is the number of the items, and
+//             subtracting from it fails for none
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Planning.h"
@@ -36,8 +39,12 @@ class Search {
     if (here.role != XQueryRole::Predicate || !_planning.isOpen(place) || !here.step) return;
     if (here.parent == XQueryNoPlace) return;
     auto* path = XQueryWalkedPathAt(_planning, here.parent);
-    if (!path || !XQueryHidesFocusOf(*here.step, *path, here.parent, _planning)) return;
-    if (!takeNumber(place, *path)) takeExpression(place, *path);
+    if (!path) return;
+    // A path restores the focus that its start has left.
+    const bool isAll = path->start() == here.step && path->steps().empty();
+    const bool hidesFocus = XQueryHidesFocusOf(*here.step, *path, here.parent, _planning);
+    if ((isAll || hidesFocus) && takeFromBack(place, *path)) return;
+    if (hidesFocus && !takeNumber(place, *path)) takeExpression(place, *path);
   }
 
  private:
@@ -52,6 +59,28 @@ class Search {
     _planning.replace(place, std::move(number));
     const_cast<XQueryPathExpr&>(path.path()).notePositions();
     return true;
+  }
+
+  bool takeFromBack(XQueryPlaceID place, XQueryWalkedPath& path) {
+    const XQueryPlace& here = _planning.program[place];
+    const auto behind = XQueryItemsBehindAskedFor(*here.expr);
+    XQueryFromBack* fromBack = behind ? fromBackOf(*here.step, path) : nullptr;
+    if (!fromBack || fromBack->predicate != XQueryFromBack::noPredicate) return false;
+    const auto& predicates = here.step->predicates();
+    for (size_t index = 0; index < predicates.size(); ++index) {
+      if (&*here.slot == &predicates[index]) *fromBack = {index, *behind};
+    }
+    if (fromBack->predicate == XQueryFromBack::noPredicate) return false;
+    _planning.choose(place, "the position is counted from the back");
+    return true;
+  }
+
+  static XQueryFromBack* fromBackOf(const XQueryStep& step, XQueryWalkedPath& path) {
+    if (path.start() == &step) return &path.startFromBack();
+    for (XQueryWalkedStep& each : path.changeableSteps()) {
+      if (each.step == &step) return each.isExpression() ? nullptr : &each.fromBack;
+    }
+    return nullptr;
   }
 
   // Of the first predicate of an axis step that is no part of its test.
