@@ -1,8 +1,8 @@
 // The documents and raw bodies of one context.
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
+#include "Platform/Base/CountedBytes.h"
 #include "Platform/Base/WorkMeter.h"
-#include "Platform/Loading/GatheredBytes.h"
 #include "Platform/Text/ASCII.h"
 #include "xquery/XMLNode.h"
 
@@ -49,7 +49,8 @@ Value XQueryContextInternal::XQueryDocumentForURL(const Ref<NSURL>& URL) {
   const Ref<NSURLLoader> loader = _loader;
   const auto resource = loader->load(*URL, XQueryLoadPurpose::Document);
   Value result = NSNull::null();
-  const CountedBytes counted(resource ? resource->data.size() : 0);
+  CountedBytes counted;
+  if (resource) counted.add(resource->data.size());
   if (resource && NSURLLoader::hasUsableStatus(*resource)) {
     const uint32_t options = isHTML(*resource, *URL) ? HTMLOptions : XMLOptions;
     if (const auto document = NSXMLDocument::documentWithData(resource->data, options)) {

@@ -13,6 +13,12 @@ class CountedBytes {
   CountedBytes(const CountedBytes&) = delete;
   CountedBytes& operator=(const CountedBytes&) = delete;
 
+  // More of them. Throws std::bad_alloc, counting nothing, for a large block that would exceed what
+  // the evaluation may take.
+  void add(size_t bytes) {
+    countValueBlock(bytes);
+    _bytes += bytes;
+  }
   // So many they are now. Whether that is too many shows at the next look.
   void set(size_t bytes) {
     uncountValueBytes(_bytes);

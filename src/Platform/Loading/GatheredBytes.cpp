@@ -1,7 +1,5 @@
 #include "Platform/Loading/GatheredBytes.h"
 
-#include "Platform/Base/WorkMeter.h"
-
 #include <algorithm>
 
 namespace xquery {
@@ -12,15 +10,6 @@ constexpr size_t leastChunk = size_t{64} << 10;
 constexpr size_t mostChunk = size_t{1} << 20;
 
 }  // namespace
-
-CountedBytes::~CountedBytes() {
-  uncountValueBytes(_bytes);
-}
-
-void CountedBytes::add(size_t bytes) {
-  countValueBlock(bytes);
-  _bytes += bytes;
-}
 
 void GatheredBytes::addChunk() {
   const size_t size =

@@ -5,27 +5,14 @@
 // and what is taken out at the end is moved there chunk by chunk.
 #pragma once
 
+#include "Platform/Base/CountedBytes.h"
+
 #include <cstddef>
 #include <string>
 #include <string_view>
 #include <vector>
 
 namespace xquery {
-
-// Counts as long as it lives.
-class CountedBytes {
- public:
-  CountedBytes() = default;
-  explicit CountedBytes(size_t bytes) { add(bytes); }
-  ~CountedBytes();
-  CountedBytes(const CountedBytes&) = delete;
-  CountedBytes& operator=(const CountedBytes&) = delete;
-  // Throws std::bad_alloc, counting nothing, where a limit of the evaluation does not allow it.
-  void add(size_t bytes);
-
- private:
-  size_t _bytes = 0;
-};
 
 class GatheredBytes {
  public:

@@ -1,7 +1,7 @@
 #include "Platform/Stylesheets/Stylesheet.h"
 
+#include "Platform/Base/CountedBytes.h"
 #include "Platform/Base/HostFailure.h"
-#include "Platform/Loading/GatheredBytes.h"
 #include "Platform/Stylesheets/LibXSLT.h"
 #include "xquery/Error.h"
 #include "xquery/Loading.h"
@@ -25,7 +25,8 @@ Ref<NSXMLDocument> load(const NSURL& URL, XQueryLoadPurpose purpose, NSURLLoader
     failure = "cannot load " + withoutCredentials(URL.absoluteString()->utf8());
     return nullptr;
   }
-  const CountedBytes counted(resource->data.size());
+  CountedBytes counted;
+  counted.add(resource->data.size());
   NSXMLParseError error;
   const auto document = NSXMLDocument::documentWithData(resource->data, options, &error);
   if (!document) {
