@@ -103,7 +103,7 @@ struct XQueryLoadingLimits {
   // For one resource, its redirects included.
   std::chrono::milliseconds totalTimeout{60'000};
   int mostRedirects = 5;
-  // Of one resource.
+  // Of one resource, as it is fetched; of a document that is packed, the text as well.
   uint64_t mostBytes = uint64_t{256} << 20;
   // That one compilation may fetch. What lies beyond cannot be accessed (error 47).
   uint32_t mostModules = 10'000;

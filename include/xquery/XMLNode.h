@@ -141,9 +141,10 @@ struct NSXMLBlock {
 
 static_assert(sizeof(NSXMLBlock) == 16);
 
-// Told how many bytes of a file have been read so far, after each piece of at most a few hundred
-// kilobytes, and how many the file has; that is 0 for what has no size, as a pipe. Some texts are
-// read again from their beginning. Called on the thread that reads; must not throw.
+// Told how many bytes of a file, which may be packed, have been read so far, after each piece of at
+// most a few hundred kilobytes, and how many the file has; that is 0 for what has no size, as a
+// pipe. Some texts are read again from their beginning. Called on the thread that reads; must not
+// throw.
 using NSXMLReadingProgress = std::function<void(uint64_t bytes, uint64_t whole)>;
 
 // A node of any kind. To walk a tree:
@@ -376,6 +377,11 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
   // are declared by 10,000, the namespaces in scope by 250,000 and fewer for large tags. Without
   // NSXMLNodePreserveWhitespace a text of white space only is dropped unless xml:space says
   // preserve.
+  //
+  // Bytes that gzip, xz, zstd or bzip2 has packed, which their beginning shows, are the text that
+  // was packed, several members one after another all of it. Refused, with 0 as the line, is what
+  // is cut short, damaged or followed by something else, what takes more than 128 MiB to unpack,
+  // and text of more than 256 MiB that is more than 1,000 times as long as it is packed.
   //
   // With NSXMLDocumentTidyHTML the bytes are HTML of any quality, in the encoding that they name.
   // What is missing is added: there is always html, head and body. Names are in lower case,

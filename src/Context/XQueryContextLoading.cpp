@@ -3,6 +3,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Platform/Base/CountedBytes.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Reading/XMLDocuments.h"
 #include "Platform/Text/ASCII.h"
 #include "xquery/XMLNode.h"
 
@@ -30,7 +31,11 @@ size_t bytesOf(const NSURL& URL) {
 
 bool isHTML(const XQueryResource& resource, const NSURL& URL) {
   if (resource.MIMEType && lowerCase(*resource.MIMEType) == "text/html") return true;
-  const std::string path = lowerCase(URL.relativePath());
+  std::string path = lowerCase(URL.relativePath());
+  // What is packed is called after what is in it.
+  for (const std::string_view ending : {".gz", ".xz", ".zst", ".bz2"}) {
+    if (path.ends_with(ending)) path.resize(path.size() - ending.size());
+  }
   return path.ends_with(".html") || path.ends_with(".htm");
 }
 
@@ -53,7 +58,10 @@ Value XQueryContextInternal::XQueryDocumentForURL(const Ref<NSURL>& URL) {
   if (resource) counted.add(resource->data.size());
   if (resource && NSURLLoader::hasUsableStatus(*resource)) {
     const uint32_t options = isHTML(*resource, *URL) ? HTMLOptions : XMLOptions;
-    if (const auto document = NSXMLDocument::documentWithData(resource->data, options)) {
+    const uint64_t mostBytes = loader->loading().limits.mostBytes;
+    NSXMLParseError ignored;
+    if (const auto document =
+            documentWithBoundedData(resource->data, options, mostBytes, ignored)) {
       document->setURI(URL->absoluteString());
       result = document;
     }

@@ -4,6 +4,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Loading/HTTPServer.h"
 #include "Platform/Loading/LoadingTestSupport.h"
+#include "Platform/Reading/PackedText.h"
 #include "xquery/xquery.h"
 
 #include <gtest/gtest.h>
@@ -147,14 +148,16 @@ struct ModeRow {
 
 TEST_F(Loading, TypeAndPathDecideBetweenXmlAndHtml) {
   constexpr ModeRow rows[] = {
-      {"/type/1", "text/html", true},  {"/type/2", "TEXT/Html; charset=utf-8", true},
-      {"/type/3", "text/htm", false},  {"/type/4", "application/xhtml+xml", false},
-      {"/type/5", nullptr, false},     {"/name.html", nullptr, true},
-      {"/name.htm", nullptr, true},    {"/NAME.HTM", nullptr, true},
-      {"/Name.Html", nullptr, true},   {"/name.html", "application/xml", true},
-      {"/name.xhtml", nullptr, false}, {"/html", nullptr, false},
-      {"/name.html/", nullptr, false}, {"/name?x.html", nullptr, false},
-      {"/name.html?x", nullptr, true}, {"/name.%68tml", nullptr, true},
+      {"/type/1", "text/html", true},   {"/type/2", "TEXT/Html; charset=utf-8", true},
+      {"/type/3", "text/htm", false},   {"/type/4", "application/xhtml+xml", false},
+      {"/type/5", nullptr, false},      {"/name.html", nullptr, true},
+      {"/name.htm", nullptr, true},     {"/NAME.HTM", nullptr, true},
+      {"/Name.Html", nullptr, true},    {"/name.html", "application/xml", true},
+      {"/name.xhtml", nullptr, false},  {"/html", nullptr, false},
+      {"/name.html/", nullptr, false},  {"/name?x.html", nullptr, false},
+      {"/name.html?x", nullptr, true},  {"/name.%68tml", nullptr, true},
+      {"/name.html.gz", nullptr, true}, {"/name.HTM.Bz2", nullptr, true},
+      {"/name.gz", nullptr, false},     {"/name.xml.xz", nullptr, false},
   };
   for (const ModeRow& row : rows) {
     const std::string header =
@@ -189,6 +192,33 @@ TEST_F(Loading, WhiteSpaceOnlyTextIsDroppedAndCDATAKept) {
                                   "<a> <b/>\n<c xml:space='preserve'> </c>"
                                   "<d><![CDATA[<x>]]></d> y </a>")),
             "<a><b/><c xml:space=\"preserve\"> </c><d><![CDATA[<x>]]></d> y </a>");
+}
+
+TEST_F(Loading, PackedDocumentsAreUnpackedAndBodiesAreNot) {
+  for (const packing::Format& format : packing::formats) {
+    const std::string packed = format.pack("<a>x</a>");
+    const std::string name = std::string("/") + format.name;
+    server.answer(name, "application/octet-stream", packed);
+    EXPECT_EQ(document(server.URL(name)), "<a>x</a>");
+    EXPECT_EQ(document(folder.write(format.name, packed)), "<a>x</a>");
+    context = XQueryContext::xqueryContext();
+    EXPECT_EQ(body(server.URL(name)), packed);
+    EXPECT_EQ(document(folder.write("cut", packed.substr(0, packed.size() - 1))), "(empty)");
+  }
+}
+
+TEST_F(Loading, WhatMayBeFetchedIsUnpackedToNoMoreBytesThanThat) {
+  const std::string text = "<a>" + std::string(100000, ' ') + "x</a>";
+  XQueryLoading loading;
+  for (const packing::Format& format : packing::formats) {
+    for (const size_t most : {text.size(), text.size() - 1}) {
+      loading.limits.mostBytes = most;
+      context = XQueryContext::xqueryContext();
+      context->contextSetLoading(loading);
+      const std::string found = document(folder.write("packed", format.pack(text)));
+      EXPECT_EQ(found == text, most == text.size()) << format.name;
+    }
+  }
 }
 
 TEST_F(Loading, ADocumentReportsTheUrlItWasAskedForBy) {

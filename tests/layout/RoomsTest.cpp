@@ -45,8 +45,9 @@ constexpr std::array<std::string_view, 2> narrowHeaders = {
 };
 
 // The libraries behind the platform, by how their headers are named.
-constexpr std::array<std::string_view, 9> libraryHeaders = {
-    "libxml/", "libxslt/", "libexslt/", "unicode/", "curl/", "pcre2", "gmp", "tidy", "hwy/",
+constexpr std::array<std::string_view, 13> libraryHeaders = {
+    "libxml/", "libxslt/", "libexslt/", "unicode/", "curl/",   "pcre2", "gmp",
+    "tidy",    "hwy/",     "zlib.h",    "lzma.h",   "bzlib.h", "zstd",
 };
 
 struct Include {

@@ -88,23 +88,11 @@ void TextSource::fill() {
     _hasFailed = count < 0;
     _isOver = count <= 0;
     if (_isOver) break;
-    if (_keeps) keepPiece(at, static_cast<size_t>(count));
+    if (_keeps) _kept.append({at, static_cast<size_t>(count)});
     at += count;
     checkWork(1 + static_cast<size_t>(count) / bytesPerStep);
   }
   _end = at;
-}
-
-void TextSource::keepPiece(const char* bytes, size_t count) {
-  constexpr size_t pieceBytes = size_t{1} << 18;
-  std::string_view rest(bytes, count);
-  while (!rest.empty()) {
-    if (_kept.empty() || _kept.back().size() == pieceBytes) _kept.emplace_back();
-    ValueText<char>& piece = _kept.back();
-    const size_t part = std::min(rest.size(), pieceBytes - piece.size());
-    piece.append(rest.substr(0, part));
-    rest.remove_prefix(part);
-  }
 }
 
 // Large pieces of the input, for a reader of small ones.
@@ -123,19 +111,9 @@ ptrdiff_t TextSource::readPieces(char* buffer, size_t size) {
 }
 
 ptrdiff_t TextSource::readAgain(char* buffer, size_t size) {
-  while (_piece < _kept.size() && _at == _kept[_piece].size()) {
-    ++_piece;
-    _at = 0;
-  }
-  if (_piece == _kept.size()) {
-    if (_hasFailed) return -1;
-    return _isOver ? 0 : readPieces(buffer, size);
-  }
-  const std::string_view piece = _kept[_piece];
-  const size_t count = std::min(size, piece.size() - _at);
-  std::memcpy(buffer, piece.data() + _at, count);
-  _at += count;
-  return static_cast<ptrdiff_t>(count);
+  if (const size_t count = _kept.read(buffer, size)) return static_cast<ptrdiff_t>(count);
+  if (_hasFailed) return -1;
+  return _isOver ? 0 : readPieces(buffer, size);
 }
 
 TextInput TextSource::fromTheBeginning() {
@@ -148,7 +126,7 @@ TextInput TextSource::fromTheBeginning() {
     };
   }
   freeWindow();
-  _piece = _at = 0;
+  _kept.rewind();
   if (!_keeps) {
     _hasFailed = !_rewind();
     _isOver = false;

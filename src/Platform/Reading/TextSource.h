@@ -3,12 +3,10 @@
 // again from its beginning, all of it is kept, for the case that another reader is to have it.
 #pragma once
 
-#include "Platform/Text/Blocks.h"
+#include "Platform/Reading/KeptText.h"
 
 #include <functional>
-#include <optional>
 #include <string_view>
-#include <vector>
 
 namespace xquery {
 
@@ -46,7 +44,6 @@ class TextSource {
  private:
   void makeWindow(size_t size, const char* keep);
   void fill();
-  void keepPiece(const char* bytes, size_t count);
   ptrdiff_t readPieces(char* buffer, size_t size);
   ptrdiff_t readAgain(char* buffer, size_t size);
   void freeWindow();
@@ -63,9 +60,7 @@ class TextSource {
   bool _isOver = false;
   bool _hasFailed = false;
   bool _keeps = false;
-  std::vector<ValueText<char>> _kept;
-  size_t _piece = 0;  // when it is read again
-  size_t _at = 0;
+  KeptText _kept;
 };
 
 }  // namespace xquery

@@ -17,6 +17,11 @@ enum class XMLWay : uint8_t {
 [[nodiscard]] Ref<NSXMLDocument> readDocument(TextSource& source, uint32_t options,
                                               NSXMLParseError& error, XMLWay way = XMLWay::Either);
 
+// NSXMLDocument::documentWithData, where packed text may be so long and no longer.
+[[nodiscard]] Ref<NSXMLDocument> documentWithBoundedData(std::string_view bytes, uint32_t options,
+                                                         uint64_t mostBytes,
+                                                         NSXMLParseError& error);
+
 // libxml2's way.
 [[nodiscard]] Ref<NSXMLDocument> readWithLibXML(const TextInput& input, uint32_t options,
                                                 size_t expectedBytes, NSXMLParseError& error);

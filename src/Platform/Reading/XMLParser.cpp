@@ -1,12 +1,15 @@
 // The doors through which documents come in.
 #include "Platform/Base/CountedBytes.h"
 #include "Platform/Reading/Tidy.h"
+#include "Platform/Reading/UnpackedInput.h"
 #include "Platform/Reading/XMLDocuments.h"
 #include "Platform/Reading/XMLReader.h"
 
 #include <cerrno>
 #include <cstring>
 #include <fcntl.h>
+#include <limits>
+#include <optional>
 #include <sys/stat.h>
 #include <unistd.h>
 #include <vector>
@@ -23,17 +26,34 @@ Ref<NSXMLDocument> parseHTML(std::string_view bytes, uint32_t options, NSXMLPars
     return nullptr;
   }
   const CountedBytes counted(XHTML->capacity());
-  return NSXMLDocument::documentWithData(*XHTML, options & ~uint32_t{NSXMLDocumentTidyHTML},
-                                         &error);
+  TextSource source(*XHTML);
+  return readDocument(source, options, error);
 }
 
-std::string readAll(const TextInput& read) {
-  std::string bytes;
+// Nothing where the input fails.
+std::optional<ValueText<char>> readAll(const TextInput& read) {
+  ValueText<char> bytes;
   std::vector<char> piece(size_t{64} * 1024);
-  for (ptrdiff_t count = 0; (count = read(piece.data(), piece.size())) > 0;) {
-    bytes.append(piece.data(), static_cast<size_t>(count));
+  ptrdiff_t count = 0;
+  while ((count = read(piece.data(), piece.size())) > 0) {
+    appendInBlocks(bytes, std::string_view(piece.data(), static_cast<size_t>(count)));
   }
+  if (count < 0) return std::nullopt;
   return bytes;
+}
+
+// Null as well where the packed bytes turn out to be bad, whatever has been read of them.
+Ref<NSXMLDocument> readUnpacked(UnpackedInput& input, uint32_t options, NSXMLParseError& error) {
+  Ref<NSXMLDocument> document;
+  if (options & NSXMLDocumentTidyHTML) {
+    if (const auto bytes = readAll(input.input())) document = parseHTML(*bytes, options, error);
+  } else {
+    TextSource source(input.input(), input.rewinding());
+    document = readDocument(source, options, error);
+  }
+  if (input.failure().empty()) return document;
+  error = {input.failure(), 0, 0};
+  return nullptr;
 }
 
 // An open file, closed at the end unless it is standard input.
@@ -80,8 +100,9 @@ class InputFile {
   uint64_t _bytesRead = 0;
 };
 
-Ref<NSXMLDocument> unreadable(const std::string& path, int failure, NSXMLParseError& error) {
-  error = {path + ": " + std::strerror(failure), 0, 0};
+Ref<NSXMLDocument> unreadable(const std::string& path, const std::string& failure,
+                              NSXMLParseError& error) {
+  error = {path + ": " + failure, 0, 0};
   return nullptr;
 }
 
@@ -96,12 +117,29 @@ Ref<NSXMLDocument> readDocument(TextSource& source, uint32_t options, NSXMLParse
   return readWithLibXML(source.fromTheBeginning(), options, source.expectedBytes(), error);
 }
 
+Ref<NSXMLDocument> documentWithBoundedData(std::string_view bytes, uint32_t options,
+                                           uint64_t mostBytes, NSXMLParseError& error) {
+  if (packingOf(bytes)) {
+    TextSource packed(bytes);
+    TextInput input = packed.fromTheBeginning();
+    const auto rewind = [&] {
+      input = packed.fromTheBeginning();
+      return true;
+    };
+    UnpackedInput unpacked([&](char* buffer, size_t size) { return input(buffer, size); }, rewind,
+                           mostBytes);
+    return readUnpacked(unpacked, options, error);
+  }
+  if (options & NSXMLDocumentTidyHTML) return parseHTML(bytes, options, error);
+  TextSource source(bytes);
+  return readDocument(source, options, error);
+}
+
 Ref<NSXMLDocument> NSXMLDocument::documentWithData(std::string_view bytes, uint32_t options,
                                                    NSXMLParseError* error) {
   NSXMLParseError ignored;
-  if (options & NSXMLDocumentTidyHTML) return parseHTML(bytes, options, error ? *error : ignored);
-  TextSource source(bytes);
-  return readDocument(source, options, error ? *error : ignored);
+  return documentWithBoundedData(bytes, options, std::numeric_limits<uint64_t>::max(),
+                                 error ? *error : ignored);
 }
 
 Ref<NSXMLDocument> NSXMLDocument::documentWithFile(const std::string& path, uint32_t options,
@@ -110,18 +148,14 @@ Ref<NSXMLDocument> NSXMLDocument::documentWithFile(const std::string& path, uint
   NSXMLParseError ignored;
   NSXMLParseError& reported = error ? *error : ignored;
   InputFile file(path);
-  if (!file.isOpen()) return unreadable(path, errno, reported);
-  const TextInput read = [&](char* buffer, size_t size) {
-    return file.read(buffer, size, progress);
-  };
-  if (options & NSXMLDocumentTidyHTML) {
-    const std::string bytes = readAll(read);
-    if (file.failure()) return unreadable(path, file.failure(), reported);
-    return parseHTML(bytes, options, reported);
+  if (!file.isOpen()) return unreadable(path, std::strerror(errno), reported);
+  UnpackedInput input([&](char* buffer, size_t size) { return file.read(buffer, size, progress); },
+                      file.isSeekable() ? [&] { return file.rewind(); } : TextRewinding());
+  Ref<NSXMLDocument> document = readUnpacked(input, options, reported);
+  if (file.failure()) {
+    return unreadable(path, std::strerror(file.failure()), reported);
   }
-  TextSource source(read, file.isSeekable() ? [&] { return file.rewind(); } : TextRewinding());
-  Ref<NSXMLDocument> document = readDocument(source, options, reported);
-  if (!document && file.failure()) return unreadable(path, file.failure(), reported);
+  if (!input.failure().empty()) return unreadable(path, input.failure(), reported);
   return document;
 }
 

@@ -2,6 +2,7 @@
 
 #include "Platform/Base/CountedBytes.h"
 #include "Platform/Base/HostFailure.h"
+#include "Platform/Reading/XMLDocuments.h"
 #include "Platform/Stylesheets/LibXSLT.h"
 #include "xquery/Error.h"
 #include "xquery/Loading.h"
@@ -28,7 +29,8 @@ Ref<NSXMLDocument> load(const NSURL& URL, XQueryLoadPurpose purpose, NSURLLoader
   CountedBytes counted;
   counted.add(resource->data.size());
   NSXMLParseError error;
-  const auto document = NSXMLDocument::documentWithData(resource->data, options, &error);
+  const uint64_t mostBytes = loader.loading().limits.mostBytes;
+  const auto document = documentWithBoundedData(resource->data, options, mostBytes, error);
   if (!document) {
     failure = withoutCredentials(URL.absoluteString()->utf8()) + ", line " +
               std::to_string(error.line) + ": " + error.message;
