@@ -3,6 +3,7 @@
 #include "Platform/Base/WorkMeter.h"
 
 #include <string>
+#include <utility>
 
 namespace xquery {
 namespace {
@@ -206,6 +207,43 @@ TEST(Counting, EndsEarlyWhereNobodyCanTell) {
   const int64_t before = workMeter.stepsLeft;
   EXPECT_TRUE(query->_internal().body()->evaluateWithContext(*context));
   EXPECT_LT(before - workMeter.stepsLeft, 200);
+}
+
+// The number of nodes of a name below a node is known without looking at them.
+TEST(Counting, TakesNumbersFromTheIndex) {
+  const auto tree = [](int count) {
+    std::string text = "<r><s>";
+    for (int i = 0; i < count; ++i) text += i % 2 ? "<e x='1'/>" : "<f><e/></f>";
+    return document(text + "</s></r>");
+  };
+  const Value many = tree(20000);
+  for (const auto& [query, expected] :
+       {std::pair("count(//e)", "20000"), std::pair("count(//@x)", "10000"),
+        std::pair("count(descendant::f)", "10000"), std::pair("exists(//e)", "true"),
+        std::pair("count(//none)", "0"), std::pair("count(//e) > 19999", "true")}) {
+    const auto planned = compiled(query, XQueryWay::Planned);
+    const auto context = XQueryContext::xqueryContext();
+    context->_internal().setContextItem(many, 1);
+    int64_t steps = 0;
+    for (int turn = 0; turn < 4; ++turn) {
+      const int64_t before = workMeter.stepsLeft;
+      const Value value = planned->_internal().body()->evaluateWithContext(*context);
+      steps = before - workMeter.stepsLeft;
+      ASSERT_TRUE(value);
+      EXPECT_EQ(XQueryItemStringValue(*value), expected) << query;
+    }
+    EXPECT_LT(steps, 20) << query;
+  }
+  const Value few = tree(400);
+  for (const char* each :
+       {"count((//s, //r)//e)", "count(r/s//e)", "count(//f//e)", "count((//e, //f)/descendant::e)",
+        "count(//e[@x])", "count(r/(s, s)//e)", "count(//s/f[200]//e)",
+        "(count(r/s/f[last()]/descendant::e), count(//f[1]//e | //e))",
+        "for $f in //f[position() mod 50 = 0] return count($f//e)",
+        "for $f in //f[last()] return (count($f/descendant::e), exists($f//@x))",
+        "unordered { count(//e) }", "count((//e, 1)//e)"}) {
+    sameBothWays("for $turn in 1 to 4 return (" + std::string(each) + ")", few);
+  }
 }
 
 TEST(Counting, SumsOfAConstant) {

@@ -23,6 +23,35 @@ bool descendantsAreSubtree(const NSXMLNode* node) {
   return XQueryDescendantStop(node) || !node->parent() || !node->parent()->parent();
 }
 
+// Counts the nodes of a name: those that the index has, without looking at them.
+class CountVisit {
+ public:
+  CountVisit(const NSXMLExpandedName* name, XQueryPathResults& results, XQueryContext& context)
+      : _name(name), _results(results), _context(context) {}
+
+  bool operator()(NSXMLNode* found) {
+    const bool isNamed = found->kind() == Kind::Element || found->kind() == Kind::Attribute;
+    if (isNamed && found->expandedName() == _name) _results.addNode(found, _context);
+    return !_results.isComplete();
+  }
+  bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
+    return add(NSXMLIndexedElements(_name, first, stop));
+  }
+  bool visitIndexedAttributes(const NSXMLNode* first, const NSXMLNode* stop) const {
+    return add(NSXMLIndexedAttributes(_name, first, stop));
+  }
+
+ private:
+  bool add(const std::optional<NSXMLIndexedNodes>& indexed) const {
+    if (indexed) _results.addNumber(indexed->nodes.size());
+    return indexed.has_value();
+  }
+
+  const NSXMLExpandedName* _name;
+  XQueryPathResults& _results;
+  XQueryContext& _context;
+};
+
 }  // namespace
 
 const XQueryNodeQuestion* XQueryNodeQuestionIn(const XQueryExpr* predicate) {
@@ -206,6 +235,15 @@ void XQueryPathWalk::takeEachKept(size_t index, std::span<NSXMLNode* const> node
   }
 }
 
+// Whether this one walk finds all results, and nothing else is asked of them.
+bool XQueryPathWalk::countsInIndex(size_t index, int axis) const {
+  const bool isOnly = index == 0 || (index == 1 && _steps.front().absorbsNext);
+  const bool goesDown = axis == XQueryAxisDescendant || axis == XQueryAxisAttributesBelow;
+  const XQueryWalkedStep& step = _steps[index];
+  return startsFromOne && isOnly && goesDown && index + 1 == _steps.size() &&
+         results.countsOnly() && !step.hasPredicates() && !setsEveryFocus && !listingStep;
+}
+
 // Whether it is of use to ask the predicates before all nodes are found, and nobody can tell.
 bool XQueryPathWalk::filtersEach(const XQueryWalkedStep& step) const {
   return step.filtersEach && results.mayEndEarly() && !listingStep && !setsEveryFocus;
@@ -276,7 +314,10 @@ bool XQueryPathWalk::keepNodes(const XQueryExpr& predicate, const XQueryNodeQues
 // stays in registers; names are what is walked for most.
 void XQueryPathWalk::stream(size_t index, int axis, NSXMLNode* node) {
   XQueryStepTest test(_steps[index], *this);
-  if (const NSXMLExpandedName* name = test.onlyName()) {
+  const NSXMLExpandedName* const name = test.onlyName();
+  if (name && countsInIndex(index, axis)) {
+    XQueryWalkAnyAxis(node, axis, false, CountVisit(name, results, context));
+  } else if (name) {
     streamMatching(index, axis, node, [name](auto act) { return XQueryNamedVisit(name, act); });
   } else if (test.onlyNames()) {
     streamMatching(index, axis, node, [&test](auto act) { return XQueryChoiceVisit(test, act); });

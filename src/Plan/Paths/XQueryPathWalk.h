@@ -1,6 +1,6 @@
 // One walk along the steps of a path.
 //
-// Steps are taken node by node, as the path itself takes them, with five shortcuts. They rest on
+// Steps are taken node by node, as the path itself takes them, with these shortcuts. They rest on
 // steps that can be repeated: axis steps whose tests cannot raise an error and whose predicates
 // answer the same for the same focus and do nothing else (an error in a predicate only drops its
 // item). What a chain of such steps yields from a node is always the same, nobody can tell when or
@@ -23,6 +23,9 @@
 //                 descendants named a are counted by their parents, which come in document order.
 //   lookup        Where a predicate asks for a value that the index of the tree has, the step takes
 //                 the nodes with that value in place of walking (XQueryValueLookup).
+//   countsInIndex Where nothing but the number of all nodes of a name below one node is wanted, it
+//   is
+//                 that of a stretch of the index, whose nodes are not looked at.
 //   filtersEach   Where only some of the nodes are wanted, or their number, a step filters each
 //                 node as it finds it and hands it on, so that the walk ends as soon as the answer
 //                 is certain.
@@ -59,6 +62,8 @@ class XQueryPathWalk : public XQueryPathRun {
 
   // Whether an error may arise from the items that the path starts from.
   bool setsEveryFocus = true;
+  // It starts from one node.
+  bool startsFromOne = false;
   // The results will be sorted, so the order in which nodes arrive is free.
   bool orderIsFree = false;
   // A step with predicates that only lists what it would filter, and where; null otherwise.
@@ -92,6 +97,7 @@ class XQueryPathWalk : public XQueryPathRun {
                        std::vector<NSXMLNode*>& nodes);
   void collectFromBack(const XQueryWalkedStep& step, const NSXMLNode* node,
                        std::vector<NSXMLNode*>& nodes);
+  bool countsInIndex(size_t index, int axis) const;
   bool filtersEach(const XQueryWalkedStep& step) const;
   bool keepsAlone(const XQueryWalkedStep& step, size_t firstPredicate, NSXMLNode* node);
   bool filterNodes(const XQueryWalkedStep& step, size_t fromIndex, std::vector<NSXMLNode*>& nodes);

@@ -182,6 +182,7 @@ XQueryWalkedPath::Answer XQueryWalkedPath::walk(XQueryContext& context, Value& i
   if (_steps.empty() || isNull(items)) return Answer::Items;
   XQueryPathWalk walk(_steps, _trailCount, results, context);
   walk.setsEveryFocus = !XQueryAllAreNodes(items);
+  walk.startsFromOne = isa<NSXMLNode>(items.get());
   walk.orderIsFree = dynamic.ordered();
   if (results.mayEndEarly() && !mayEndEarly(items, walk)) results.takeAll();
   if (!_picker || !pickNodes(items, walk)) walk.takeValue(0, items, true);
