@@ -41,7 +41,7 @@ bool isEnded(const Endless& document, int64_t ceiling, size_t mostRead) {
 TEST(LibXMLMemory, CountsWhileADocumentIsRead) {
   for (const Endless& document : endless) {
     const int64_t before = workMeter.valueBytes;
-    EXPECT_TRUE(isEnded(document, 4 * MiB, size_t{16} << 20)) << document.what;
+    EXPECT_TRUE(isEnded(document, 2 * MiB, size_t{16} << 20)) << document.what;
     EXPECT_EQ(workMeter.valueBytes, before) << document.what;
   }
 }

@@ -15,7 +15,7 @@ using readingtest::Ceiling;
 using readingtest::Endless;
 using readingtest::MiB;
 
-constexpr size_t mostRead = size_t{64} << 20;
+constexpr size_t mostRead = size_t{16} << 20;
 
 // What is kept of a pipe counts as well: the two inputs end in the end of an evaluation.
 bool isEnded(const Endless& document, bool isFile) {
@@ -27,7 +27,7 @@ bool isEnded(const Endless& document, bool isFile) {
   TextSource source([&](char* buffer, size_t size) { return input(buffer, size); },
                     isFile ? rewind : TextRewinding());
   NSXMLParseError error;
-  const Ceiling watching(8 * MiB);
+  const Ceiling watching(2 * MiB);
   try {
     EXPECT_FALSE(readDocument(source, NSXMLNodePreserveWhitespace, error)) << document.what;
   } catch (const Ended&) {

@@ -249,12 +249,13 @@ TEST(XMLReader, EveryBeginningIsLeft) {
 }
 
 TEST(XMLReader, EveryByteMayBeAnother) {
+  size_t count = 0;
   for (const std::string_view text : taken) {
     for (size_t at = 0; at < text.size(); ++at) {
       for (const char byte : {'\0', '\r', '<', '>', '&', 'x', ':', '\xC3'}) {
         std::string changed(text);
         changed[at] = byte;
-        isTaken(changed);
+        isTakenWith(allOptions[count++ % std::size(allOptions)], changed);
       }
     }
   }
@@ -333,10 +334,10 @@ std::string tagOf(int attributes) {
   return text;
 }
 
-TEST(XMLReader, ATagOfTwoHundredThousandAttributes) {
-  const auto document = read(tagOf(200000) + "/>", XMLWay::Own);
+TEST(XMLReader, ATagOfVeryManyAttributes) {
+  const auto document = read(tagOf(60000) + "/>", XMLWay::Own);
   ASSERT_TRUE(document);
-  EXPECT_EQ(document->rootElement()->attributeCount(), 200000U);
+  EXPECT_EQ(document->rootElement()->attributeCount(), 60000U);
 }
 
 TEST(XMLReader, AttributesOfATagAreDistinctHoweverManyThereAre) {
