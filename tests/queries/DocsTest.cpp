@@ -1,156 +1,139 @@
-// Holds docs/functions.md to the registry and runs its examples. An entry begins with a heading
-//
-//   ### fn:name(arguments)
-//
-// or with a row of a table whose first cell is `fn:name(arguments)`, and ends where the next one
-// begins; its examples are written `query` → `result`.
-#include "Functions/XQueryBuiltInFunction.h"
-#include "xquery/xquery.h"
+// Runs the examples in the documents for people and follows their links.
+#include "DocsExamples.h"
 
 #include <gtest/gtest.h>
 
 #include <cctype>
-#include <cstring>
-#include <fstream>
+#include <filesystem>
+#include <map>
 #include <set>
-#include <string>
-#include <string_view>
-#include <vector>
 
-namespace xquery {
+namespace xquery::docs {
 namespace {
 
-struct Example {
-  std::string query, result;
-  int line = 0;
-};
+// --- examples ------------------------------------------------------------------------------------
 
-struct Entry {
-  std::string name;  // with its prefix
-  int line = 0;
-  std::vector<Example> examples;
-};
-
-std::string entryName(std::string_view line) {
-  for (const std::string_view start : {"### ", "| `"}) {
-    if (!line.starts_with(start)) continue;
-    line.remove_prefix(start.size());
-    return std::string(line.substr(0, line.find('(')));
-  }
-  return "";
+TEST(Documents, ExamplesGiveTheResultsThatAreSaid) {
+  for (const Document& document : readDocuments()) EXPECT_EQ(failuresOf(document), "");
 }
 
-// The text of the code that begins at `at`, a back quote; `at` goes behind it.
-std::string takeCode(std::string_view line, size_t& at) {
-  const size_t end = line.find('`', at + 1);
-  if (end == line.npos) return "";
-  const std::string code(line.substr(at + 1, end - at - 1));
-  at = end + 1;
-  return code;
-}
-
-void addExamples(std::string_view line, int number, std::vector<Example>& examples) {
-  constexpr std::string_view arrow = " → ";
-  for (size_t at = 0; (at = line.find('`', at)) != line.npos;) {
-    Example example;
-    example.line = number;
-    example.query = takeCode(line, at);
-    if (example.query.empty()) return;
-    if (line.substr(at, arrow.size()) != arrow) continue;
-    at += arrow.size();
-    if (at >= line.size() || line[at] != '`') continue;
-    example.result = takeCode(line, at);
-    examples.push_back(std::move(example));
+TEST(Documents, EachPageForThoseWhoWriteQueriesHasExamples) {
+  for (const char* name :
+       {"docs/guide.md", "docs/dialect.md", "docs/functions.md", "docs/errors.md"}) {
+    EXPECT_GT(readDocument(name).examples.size(), 30u) << name;
   }
 }
 
-std::vector<Entry> readEntries() {
-  std::ifstream in(std::string(XQUERY_SOURCE_DIR) + "/docs/functions.md");
-  std::vector<Entry> entries;
-  std::string line;
-  for (int number = 1; std::getline(in, line); ++number) {
-    if (const std::string name = entryName(line); !name.empty()) {
-      entries.push_back({name, number, {}});
+std::string failuresIn(std::string_view text) {
+  return failuresOf(documentOf("page.md", text));
+}
+
+TEST(Documents, RightExamplesHaveNoFailures) {
+  EXPECT_EQ(failuresIn("`1, 2` → `1, 2`, `()` → `()`, `1 eq 'a'` → `error 6 invalid type for "
+                       "operator`\n"),
+            "");
+  EXPECT_EQ(failuresIn("```xquery\n1,\n2\n```\n\n```text\n1\n2\n```\n"), "");
+  EXPECT_EQ(failuresIn("<!-- input: examples/books.xml -->\n```xquery\ncount(//book)\n```\n"
+                       "```text\n4\n```\n"),
+            "");
+  EXPECT_EQ(failuresIn("<!-- var: x=7 -->\n```xquery\ndeclare variable $x external; $x\n```\n"
+                       "```text\n7\n```\n"),
+            "");
+}
+
+TEST(Documents, WrongExamplesAreFound) {
+  // Both ways of evaluating are tried.
+  EXPECT_EQ(failuresIn("\n`1 + 1` → `3`\n"),
+            "page.md:2: 1 + 1\n  gives 2\n  and not 3\n"
+            "page.md:2: 1 + 1\n  gives 2\n  and not 3\n");
+  EXPECT_NE(failuresIn("| a | `1` → `1` | `2` → `1` |\n"), "");
+  EXPECT_NE(failuresIn("`1 + 'a'` → `error 6 invalid type`\n"), "");
+  EXPECT_NE(failuresIn("`('', '')` → `()`\n"), "");
+  EXPECT_NE(failuresIn("```xquery\n1, 2\n```\n```text\n1, 2\n```\n"), "");
+  // The variable was that of the block before.
+  EXPECT_NE(failuresIn("<!-- var: x=7 -->\n```xquery\n1\n```\n```text\n1\n```\n"
+                       "```xquery\ndeclare variable $x external; $x\n```\n```text\n7\n```\n"),
+            "");
+}
+
+TEST(Documents, WhatLooksLikeAnExampleAndIsNoneIsFound) {
+  EXPECT_EQ(failuresIn("`1` → 1\n"), "page.md:1: an arrow without a result\n");
+  EXPECT_EQ(failuresIn("```xquery\n1\n```\ntext\n"), "page.md:1: a query without a result\n");
+  EXPECT_EQ(failuresIn("```sh\nls\n"), "page.md:1: a block without an end\n");
+}
+
+// --- links ---------------------------------------------------------------------------------------
+
+// The anchor that a heading gets: lower case, blanks as hyphens, no punctuation.
+std::string anchorOf(std::string heading) {
+  constexpr std::string_view dots = "…";
+  for (size_t at; (at = heading.find(dots)) != heading.npos;) heading.erase(at, dots.size());
+  std::string anchor;
+  for (const char c : heading) {
+    const auto byte = static_cast<unsigned char>(c);
+    if (byte == ' ') anchor += '-';
+    if (byte >= 0x80 || std::isalnum(byte) || byte == '-' || byte == '_') {
+      anchor += static_cast<char>(byte < 0x80 ? std::tolower(byte) : byte);
     }
-    if (!entries.empty()) addExamples(line, number, entries.back().examples);
   }
-  return entries;
+  return anchor;
 }
 
-// As the document names functions: "xs:string".
-std::string nameOf(const XQueryBuiltInFunction::Registration& row) {
-  const char* prefix = row.namespaceID == XQueryNamespaceFN    ? "fn"
-                       : row.namespaceID == XQueryNamespaceXS  ? "xs"
-                       : row.namespaceID == XQueryNamespaceXDT ? "xdt"
-                                                               : "ext";
-  return std::string(prefix) + ":" + std::string(row.localName);
-}
-
-std::string printed(const NSObject& item) {
-  if (const auto* node = dyn_cast<NSXMLNode>(&item)) return node->XMLString()->utf8();
-  return XQueryItemStringValue(item);
-}
-
-// Examples that load a file find it in the folder of the examples.
-std::string withBase(const std::string& query) {
-  if (query.find(".xml'") == query.npos && query.find(".xsl'") == query.npos) return query;
-  return "declare base-uri 'file://" XQUERY_SOURCE_DIR "/examples/'; " + query;
-}
-
-std::string evaluated(const std::string& query, XQueryWay way) {
-  const auto compiled =
-      XQuery::xqueryWithSource(std::string_view(query), XQueryLoading(), XQueryLimits(), way);
-  const auto context = XQueryContext::xqueryContext();
-  Ref<XQueryError> error;
-  const auto items = context->evaluateXQuery(*compiled, {}, {}, &error);
-  if (error) return "error " + std::to_string(error->err()) + " " + error->msg()->utf8();
-  if (!items) return "no result";
-  std::string text;
-  for (const Value& item : items->objects()) text += (text.empty() ? "" : ", ") + printed(*item);
-  return items->count() == 0 ? "()" : text;
-}
-
-// Whether the query calls the function of an entry, whose prefix may be left out when it is "fn".
-bool calls(std::string_view query, std::string_view name) {
-  const bool isStandard = name.starts_with("fn:");
-  const std::string call = std::string(isStandard ? name.substr(3) : name) + "(";
-  for (size_t at = 0; (at = query.find(call, at)) != query.npos; ++at) {
-    const std::string_view before = query.substr(0, at);
-    if (isStandard && before.ends_with("fn:")) return true;
-    // "name(" is no call of name in "local-name(" and in "p:name(".
-    const char last = before.empty() ? ' ' : before.back();
-    if (!std::isalnum(static_cast<unsigned char>(last)) && !std::strchr("-_.:", last)) return true;
+std::set<std::string> anchorsOf(const Document& document) {
+  std::set<std::string> anchors;
+  std::map<std::string, int> times;
+  for (const std::string& line : document.lines) {
+    if (!line.starts_with("#")) continue;
+    const size_t text = line.find(' ');
+    if (text == line.npos) continue;
+    const std::string anchor = anchorOf(line.substr(text + 1));
+    const int before = times[anchor]++;
+    anchors.insert(before == 0 ? anchor : anchor + "-" + std::to_string(before));
   }
-  return false;
+  return anchors;
 }
 
-TEST(FunctionsDocument, HasOneEntryForEachFunctionAndNoOther) {
-  std::multiset<std::string> documented, registered;
-  for (const Entry& entry : readEntries()) documented.insert(entry.name);
-  for (const auto& row : XQueryBuiltInFunction::registrations()) registered.insert(nameOf(row));
-  EXPECT_EQ(documented, registered);
-}
+using Anchors = std::map<std::string, std::set<std::string>>;  // by the name of the document
 
-TEST(FunctionsDocument, EachEntryHasAnExampleThatCallsTheFunction) {
-  for (const Entry& entry : readEntries()) {
-    bool isCalled = false;
-    for (const Example& example : entry.examples) {
-      isCalled = isCalled || calls(example.query, entry.name);
-    }
-    EXPECT_TRUE(isCalled) << entry.name << ", line " << entry.line;
+// Whether what stands in the brackets of a link is there: another page, a file, a heading.
+bool leadsSomewhere(const std::string& target, const std::string& from, const Anchors& anchors) {
+  if (target.starts_with("http")) return true;
+  const size_t hash = target.find('#');
+  std::string name = from;
+  if (hash != 0) {
+    const auto folder = std::filesystem::path(from).parent_path();
+    name = (folder / target.substr(0, hash)).lexically_normal().string();
+    if (!std::filesystem::exists(std::string(XQUERY_SOURCE_DIR) + "/" + name)) return false;
   }
+  if (hash == target.npos) return true;
+  const auto page = anchors.find(name);
+  return page != anchors.end() && page->second.contains(target.substr(hash + 1));
 }
 
-TEST(FunctionsDocument, ExamplesGiveTheResultsThatAreSaid) {
-  for (const Entry& entry : readEntries()) {
-    for (const Example& example : entry.examples) {
-      for (const XQueryWay way : {XQueryWay::Plain, XQueryWay::Planned}) {
-        EXPECT_EQ(evaluated(withBase(example.query), way), example.result)
-            << "docs/functions.md:" << example.line << " " << example.query;
+TEST(Documents, LinksLeadToFilesAndHeadingsThatAreThere) {
+  const std::vector<Document> documents = readDocuments();
+  Anchors anchors;
+  for (const Document& document : documents) anchors[document.name] = anchorsOf(document);
+  for (const Document& document : documents) {
+    for (size_t number = 0; number < document.lines.size(); ++number) {
+      const std::string& line = document.lines[number];
+      for (size_t at = 0; (at = line.find("](", at)) != line.npos; ++at) {
+        const std::string target = line.substr(at + 2, line.find(')', at) - at - 2);
+        if (target.find_first_of(" `'\"") != target.npos) continue;  // code
+        EXPECT_TRUE(leadsSomewhere(target, document.name, anchors))
+            << document.name << ":" << number + 1 << " " << target;
       }
     }
   }
 }
 
+TEST(Documents, LinksThatLeadNowhereAreFound) {
+  const Anchors anchors{{"docs/a.md", {"first-step"}}};
+  EXPECT_TRUE(leadsSomewhere("#first-step", "docs/a.md", anchors));
+  EXPECT_TRUE(leadsSomewhere("../README.md", "docs/a.md", anchors));
+  EXPECT_FALSE(leadsSomewhere("#second-step", "docs/a.md", anchors));
+  EXPECT_FALSE(leadsSomewhere("missing.md", "docs/a.md", anchors));
+}
+
 }  // namespace
-}  // namespace xquery
+}  // namespace xquery::docs
