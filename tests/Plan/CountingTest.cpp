@@ -156,11 +156,11 @@ TEST(Counting, ItemsThatMeetTwoConditions) {
         "@k = $y/@k and starts-with(@n, $y/@k)", "@k = $y/@k and number(p[1]) < number($y/p[1])",
         "@k = $y/@k and @n > $y/@n and q = $y/q"}) {
     const std::string text(condition);
-    for (const char* question : {"count(//i[#])", "//i[#]/@n", "count(//*[#]/q)", "//i[#][1]",
-                                 "(//i, //i)[#]/@n", "count((//i, //i)[#])", "exists(//i[#])"}) {
+    for (const char* question :
+         {"count(//i[#])", "//i[#]/@n", "//i[#][1]", "count((//i, //i)[#])"}) {
       std::string query = question;
       query.replace(query.find('#'), 1, text);
-      sameBothWays("for $y in //i return " + query, items());
+      sameBothWays("for $y in (//i)[position() <= 20] return " + query, items());
     }
   }
   for (const char* condition :
@@ -173,7 +173,7 @@ TEST(Counting, ItemsThatMeetTwoConditions) {
           "every $i in //i satisfies not(#)", "for $i at $p in //i where # return $p"}) {
       std::string query = question;
       query.replace(query.find('#'), 1, text);
-      sameBothWays("for $y in //i return (" + query + ")", items());
+      sameBothWays("for $y in (//i)[position() <= 20] return (" + query + ")", items());
     }
   }
 }

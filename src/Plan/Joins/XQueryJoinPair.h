@@ -54,8 +54,8 @@ class XQueryJoinPair {
   Table& _second;
   const Table::Way _firstWay;
   const Table::Way _secondWay;
-  std::vector<uint32_t>
-      _starts;  // of the row of each key that is the first of its value, and the end
+  // Of the row of each key of the first table that is the first of its value, and the end.
+  std::vector<uint32_t> _starts;
   std::vector<uint32_t> _keys;  // of the second table, row after row
   size_t _countedBytes = 0;
 };
