@@ -219,8 +219,8 @@ class NSXMLTree : public NSXMLTreeHead {
     return nullptr;
   }
   // The node at which the descendant axis of queries ends: the next sibling or, without one, the
-  // parent's. Null lets it run to the end of the tree, past the subtree of the node when that is the
-  // last child of a last child.
+  // parent's. Null lets it run to the end of the tree, past the subtree of the node when that is
+  // the last child of a last child.
   static NSXMLNode* descendantStop(const NSXMLNode* node) {
     if (NSXMLNode* sibling = node->nextSibling()) return sibling;
     const NSXMLNode* parent = node->parent();

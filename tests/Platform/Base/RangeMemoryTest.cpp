@@ -1,5 +1,4 @@
 #include "Platform/Base/RangeMemory.h"
-
 #include "Platform/Base/Sanitizers.h"
 
 #include <gtest/gtest.h>
