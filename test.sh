@@ -1,12 +1,14 @@
 #!/usr/bin/env bash
 # Installs what is missing, builds, and runs every test. XQUERY_PRESET chooses another build
-# (release, debug, asan, tsan); XQUERY_WERROR=ON turns warnings into errors.
+# (release, debug, asan, tsan); XQUERY_WERROR=ON turns warnings into errors. XQUERY_TESTS_OF may name
+# the folder of a complete build without sanitizers, whose compiled tests are then used as they are.
 set -u
 . "$(dirname "${BASH_SOURCE[0]}")/cmake/prepare.sh"
 
 preset=${XQUERY_PRESET:-release}
 need_packages "${packages[@]}" || exit 1
-(build "$preset" -DXQUERY_WERROR="${XQUERY_WERROR:-OFF}") || exit 1
+(build "$preset" -DXQUERY_WERROR="${XQUERY_WERROR:-OFF}" \
+  -DXQUERY_TESTS_OF="${XQUERY_TESTS_OF:-}") || exit 1
 
 log=$(mktemp)
 trap 'rm -f "$log"' EXIT
