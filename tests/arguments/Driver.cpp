@@ -14,6 +14,14 @@ namespace {
 
 constexpr std::string_view variables = "abcde";
 
+// Calls that are told apart by one argument of several only are many. What a sanitizer finds it
+// finds in some of them as well.
+#ifdef XQUERY_SANITIZED
+constexpr size_t oneCallIn = 11;
+#else
+constexpr size_t oneCallIn = 1;
+#endif
+
 // fn:trace would write to the log.
 class Silence : public XQueryClient {
  public:
@@ -106,16 +114,20 @@ class Comparison {
  public:
   explicit Comparison(const Function& function) : _function(function) {}
 
-  // All combinations of `count` of the values.
+  // All combinations of `count` of the values; of several, one in `oneCallIn`.
   void callWithAll(const std::vector<const Sample*>& values, size_t count, const Sample* item) {
     const Ref<XQuery> query = compiledCall(_function.name, count);
     ASSERT_FALSE(query->parseErrors()) << _function.name;
+    // Otherwise some values would never be the first argument.
+    ASSERT_TRUE(oneCallIn == 1 || values.empty() || values.size() % oneCallIn != 0);
     std::vector<size_t> choice(count, 0);
-    for (;;) {
-      Call call;
-      call.contextItem = item;
-      for (const size_t index : choice) call.arguments.push_back(values[index]);
-      compare(*query, call);
+    for (size_t number = 0;; ++number) {
+      if (count < 2 || number % oneCallIn == 0) {
+        Call call;
+        call.contextItem = item;
+        for (const size_t index : choice) call.arguments.push_back(values[index]);
+        compare(*query, call);
+      }
       size_t place = 0;
       while (place < count && ++choice[place] == values.size()) choice[place++] = 0;
       if (place == count) return;

@@ -36,7 +36,6 @@ namespace xquery {
 namespace {
 
 struct Case {
-  std::string name;
   std::string file;
   int line = 0;
   XQueryConstants constants;
@@ -71,32 +70,39 @@ void readHeader(Case& c, std::string header, std::string& section, std::string& 
   }
 }
 
-std::vector<Case> readCases(const std::filesystem::path& path) {
-  std::ifstream in(path);
-  std::vector<Case> cases;
+// Where a case stands. Each test runs in a process of its own, which registers all of them: it
+// reads no more of the others than their names.
+struct Place {
+  std::filesystem::path path;
+  int line = 0;  // of its name
+};
+
+constexpr std::string_view nameMark = "== ";
+
+Case readCase(const Place& place) {
+  Case c;
+  c.file = place.path.filename().string();
+  c.line = place.line;
+  std::ifstream in(place.path);
   std::string line, section, sectionName;
   for (int number = 1; std::getline(in, line); ++number) {
-    if (line.rfind("== ", 0) == 0) {
-      cases.emplace_back();
-      cases.back().name = line.substr(3);
-      cases.back().file = path.filename().string();
-      cases.back().line = number;
-      section.clear();
-    } else if (line.rfind("-- ", 0) == 0) {
-      readHeader(cases.back(), line.substr(3), section, sectionName);
+    if (number <= place.line) continue;
+    if (line.starts_with(nameMark)) break;
+    if (line.starts_with("-- ")) {
+      readHeader(c, line.substr(3), section, sectionName);
     } else if (section == "xml") {
-      cases.back().xml += line + "\n";
+      c.xml += line + "\n";
     } else if (section == "file") {
-      cases.back().files[sectionName] += line + "\n";
+      c.files[sectionName] += line + "\n";
     } else if (section == "module") {
-      cases.back().modules[sectionName] += line + "\n";
+      c.modules[sectionName] += line + "\n";
     } else if (section == "query") {
-      cases.back().query += line + "\n";
+      c.query += line + "\n";
     } else if (section == "result" && !line.empty()) {
-      cases.back().result.push_back(line);
+      c.result.push_back(line);
     }
   }
-  return cases;
+  return c;
 }
 
 std::string replaced(std::string text, std::string_view from, std::string_view by) {
@@ -167,7 +173,7 @@ XQueryLoading compileLoading(const Case& c) {
 
 class QueryCase : public testing::Test {
  public:
-  explicit QueryCase(Case c) : _case(std::move(c)) {}
+  explicit QueryCase(const Place& place) : _case(readCase(place)) {}
 
   void TestBody() override {
     for (const XQueryWay way : {XQueryWay::Plain, XQueryWay::Planned}) {
@@ -240,11 +246,15 @@ void registerCases(const std::filesystem::path& folder) {
   for (const auto& file : files) {
     const std::string suite = "Query" + identifier(file.stem().string());
     std::map<std::string, int> seen;
-    for (const Case& c : readCases(file)) {
-      std::string name = identifier(c.name);
+    std::ifstream in(file);
+    std::string line;
+    for (int number = 1; std::getline(in, line); ++number) {
+      if (!line.starts_with(nameMark)) continue;
+      std::string name = identifier(line.substr(nameMark.size()));
       if (const int again = seen[name]++) name += "Again" + std::to_string(again);
-      testing::RegisterTest(suite.c_str(), name.c_str(), nullptr, nullptr, file.c_str(), c.line,
-                            [c]() -> testing::Test* { return new QueryCase(c); });
+      testing::RegisterTest(
+          suite.c_str(), name.c_str(), nullptr, nullptr, file.c_str(), number,
+          [place = Place{file, number}]() -> testing::Test* { return new QueryCase(place); });
     }
   }
 }
