@@ -131,7 +131,7 @@ TEST(ICUText, ALongTextWithoutAPlaceToCutIsConvertedWhole) {
 TEST(ICUText, AHostileRunOfMarksTakesTimeInProportion) {
   for (const std::u16string_view pair : {u"\u0301\u0323", u"\u0F73\u0F73"}) {
     std::u16string text = u"a";
-    for (int index = 0; index < 500000; ++index) text += pair;
+    for (int index = 0; index < 100000; ++index) text += pair;
     for (const NSNormalizationForm form : forms) {
       const double start = processorSeconds();
       EXPECT_GE(normalizedText(text, form).size(), text.size() - 2);
