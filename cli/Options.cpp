@@ -1,9 +1,9 @@
 #include "Options.h"
 
 #include "Messages.h"
+#include "OptionsTable.h"
 #include "Output.h"
 #include "Streams.h"
-#include "xquery/xquery.h"
 
 #include <CLI/CLI.hpp>
 
@@ -28,90 +28,76 @@ class Help : public CLI::Formatter {
     return "Usage: xquery [options] QUERYFILE [INPUT]\n"
            "       xquery [options] -e QUERY [INPUT]\n";
   }
+  // The value belongs to the name where it may be left out.
+  std::string make_option_name(const CLI::Option* option, bool isPositional) const override {
+    const std::string name = CLI::Formatter::make_option_name(option, isPositional);
+    for (const OptionRow& row : optionRows()) {
+      if (row.takes == Takes::MaybeValue && name.starts_with(row.name)) {
+        return std::string(row.name) + "[=" + row.value + "]";
+      }
+    }
+    return name;
+  }
 };
 
-// Whether a value is for the query to see or a path, which may be any bytes.
-enum class Bound { Text, File };
+// The texts that stand behind an option, or of the positional arguments, as they were given.
+CLI::Option* addTexts(CLI::App& app, const std::string& name, const char* help) {
+  return app.add_option(name, CLI::callback_t([](const CLI::results_t&) { return true; }), help);
+}
 
-// Splits NAME=VALUE at the first "="; the name must not be empty.
-Binding splitBinding(const std::string& option, const std::string& text, Bound bound) {
-  const size_t equals = text.find('=');
-  if (equals == std::string::npos || equals == 0) {
-    throw CLI::ValidationError(option, "expected a name, \"=\" and a value, not \"" + text + "\"");
+void declareOption(CLI::App& app, const OptionRow& row) {
+  CLI::Option* option = nullptr;
+  switch (row.takes) {
+    case Takes::Nothing:
+      option = app.add_flag(row.name, row.help);
+      break;
+    case Takes::MaybeValue:
+      option = app.add_flag(std::string(row.name) + "{" + words(row).front() + "}", row.help);
+      break;
+    case Takes::Value:
+      option = addTexts(app, row.name, row.help)->type_name(row.value);
+      break;
+    case Takes::Values:
+      option = addTexts(app, row.name, row.help)->type_name(row.value)->take_all();
+      break;
   }
-  // The library would pass over a name or a value that it cannot read.
-  if (!xquery::NSString::stringWithUTF8(bound == Bound::Text ? text : text.substr(0, equals))) {
-    throw CLI::ValidationError(option, "not UTF-8 text: \"" + text + "\"");
-  }
-  return {text.substr(0, equals), text.substr(equals + 1)};
+  option->group(row.group);
 }
 
-std::vector<Binding> splitBindings(const std::string& option, const std::vector<std::string>& texts,
-                                   Bound bound) {
-  std::vector<Binding> bindings;
-  for (const std::string& text : texts) bindings.push_back(splitBinding(option, text, bound));
-  return bindings;
-}
-
-xquery::XQueryPlanFormat planFormat(const std::string& name) {
-  using xquery::XQueryPlanFormat;
-  if (name == "text") return XQueryPlanFormat::Text;
-  if (name == "json") return XQueryPlanFormat::JSON;
-  if (name == "dot") return XQueryPlanFormat::DOT;
-  throw CLI::ValidationError("--plan", "expected text, json or dot, not \"" + name + "\"");
-}
-
-struct RawOptions {
-  std::string query, first, second, output, plan;
-  std::vector<std::string> variables, documents, namespaces;
-};
-
-void declareOptions(CLI::App& app, RawOptions& raw, Options& options) {
+void declareOptions(CLI::App& app) {
   app.formatter(std::make_shared<Help>());
   app.footer(footer);
   app.set_version_flag("--version", "xquery " XQUERY_VERSION);
-  app.add_option("-e", raw.query, "The text of the query")->type_name("QUERY");
-  app.add_flag("--types", options.types, "Put the type and a tab before each item");
-  const auto addPairs = [&app](const char* name, std::vector<std::string>& target,
-                               const char* description, const char* type) {
-    app.add_option(name, target, description)->type_name(type)->allow_extra_args(false);
-  };
-  addPairs("--var", raw.variables, "Bind an external variable to an untyped value", "NAME=VALUE");
-  addPairs("--doc", raw.documents, "Bind an external variable to a document", "NAME=FILE");
-  addPairs("--namespace", raw.namespaces, "Make a namespace prefix known to the query", "P=URI");
-  app.add_flag("--html", options.html, "Read INPUT as HTML");
-  app.add_flag("--strip-space", options.stripSpace, "Drop text of white space only from documents");
-  app.add_option("-o", raw.output, "Write the result to a file")->type_name("FILE");
-  app.add_flag("--time", options.time, "Report the time of each phase on standard error");
-  app.add_option("--repeat", options.repeat, "Evaluate N times, print the result once")
-      ->type_name("N")
-      ->check(CLI::Range(1U, 1000000000U));
-  app.add_flag("--plan{text}", raw.plan,
-               "Show how the query is evaluated instead of its result: --plan, --plan=json or "
-               "--plan=dot");
-  app.add_option("first", raw.first)->group("");
-  app.add_option("second", raw.second)->group("");
+  for (const OptionRow& row : optionRows()) declareOption(app, row);
+  addTexts(app, "first", "")->group("");
+  addTexts(app, "second", "")->group("");
 }
 
-// Gives the positional arguments and the NAME=VALUE texts their meaning.
-void interpret(const CLI::App& app, const RawOptions& raw, Options& options) {
-  const bool hasFirst = app.count("first") > 0, hasSecond = app.count("second") > 0;
-  if (app.count("-e") > 0) {
-    if (hasSecond) throw CLI::ExtrasError({raw.second});
-    options.queryText = raw.query;
-    if (hasFirst) options.input = raw.first;
-  } else {
-    if (!hasFirst) throw CLI::RequiredError("QUERYFILE or -e QUERY");
-    options.queryFile = raw.first;
-    if (hasSecond) options.input = raw.second;
+void applyOptions(const CLI::App& app, Options& options) {
+  for (const OptionRow& row : optionRows()) {
+    for (const std::string& value : app.get_option(row.name)->results()) {
+      if (row.takes == Takes::Nothing && value != "true") {
+        throw WrongUsage(std::string(row.name) + " takes no value");
+      }
+      row.apply(row, value, options);
+    }
   }
-  if (app.count("-o") > 0) options.outputFile = raw.output;
-  if (app.count("--plan") > 0) options.plan = planFormat(raw.plan);
-  options.variables = splitBindings("--var", raw.variables, Bound::Text);
-  options.documents = splitBindings("--doc", raw.documents, Bound::File);
-  for (Binding& binding : splitBindings("--namespace", raw.namespaces, Bound::Text)) {
-    options.namespaces[binding.name] = binding.value;
+}
+
+// Gives the positional arguments their meaning.
+void interpretArguments(const CLI::App& app, Options& options) {
+  std::vector<std::string> arguments;
+  for (const char* place : {"first", "second"}) {
+    const std::vector<std::string>& given = app.get_option(place)->results();
+    arguments.insert(arguments.end(), given.begin(), given.end());
   }
+  size_t next = 0;
+  if (!options.queryText) {
+    if (arguments.empty()) throw WrongUsage("QUERYFILE or -e QUERY is required");
+    options.queryFile = arguments[next++];
+  }
+  if (next < arguments.size()) options.input = arguments[next++];
+  if (next < arguments.size()) throw CLI::ExtrasError({arguments[next]});
 }
 
 // Help and version are output like any other.
@@ -126,20 +112,26 @@ Status print(const CLI::App& app, const CLI::Success& request) {
   return StatusInput;
 }
 
+Status explain(const std::string& error) {
+  writeMessage("xquery: " + visible(error) + "\nTry xquery --help.\n");
+  return StatusUsage;
+}
+
 }  // namespace
 
 std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
   CLI::App app("Evaluates an XQuery and writes each item of the result on a line of its own.");
-  RawOptions raw;
-  declareOptions(app, raw, options);
+  declareOptions(app);
   try {
     app.parse(argc, argv);
-    interpret(app, raw, options);
+    applyOptions(app, options);
+    interpretArguments(app, options);
   } catch (const CLI::Success& success) {
     return print(app, success);
   } catch (const CLI::ParseError& error) {
-    writeMessage("xquery: " + visible(error.what()) + "\nTry xquery --help.\n");
-    return StatusUsage;
+    return explain(error.what());
+  } catch (const WrongUsage& error) {
+    return explain(error.what());
   }
   return std::nullopt;
 }

@@ -1,94 +1,19 @@
 #include "Run.h"
 
+#include "Documents.h"
+#include "ItemWriter.h"
 #include "Messages.h"
 #include "Output.h"
-#include "Progress.h"
 #include "Streams.h"
 #include "Timing.h"
 #include "xquery/xquery.h"
 
-#include <cerrno>
-#include <cstdio>
-#include <cstring>
-#include <memory>
 #include <string_view>
 
 namespace cli {
 namespace {
 
 using namespace xquery;
-
-// Ends the run with a status; what there is to say has been said.
-struct Stop {
-  Status status;
-};
-
-[[noreturn]] void stop(Status status, const std::string& message) {
-  writeMessage(visible(message) + "\n");
-  throw Stop{status};
-}
-
-struct CloseFile {
-  void operator()(std::FILE* file) const { std::fclose(file); }
-};
-
-std::string readFile(const std::string& path) {
-  const std::unique_ptr<std::FILE, CloseFile> file(std::fopen(path.c_str(), "rb"));
-  std::string text;
-  char piece[65536];
-  while (const size_t count = file ? std::fread(piece, 1, sizeof piece, file.get()) : 0) {
-    text.append(piece, count);
-  }
-  // A directory opens but cannot be read.
-  if (!file || std::ferror(file.get())) {
-    stop(StatusInput, "xquery: " + path + ": " + std::strerror(errno));
-  }
-  return text;
-}
-
-Ref<NSString> queryText(const Options& options) {
-  const std::string bytes = options.queryText ? *options.queryText : readFile(options.queryFile);
-  const Ref<NSString> text = NSString::stringWithUTF8(bytes);
-  if (!text) {
-    const std::string name = options.queryText ? "the query given with -e" : options.queryFile;
-    stop(StatusInput, "xquery: " + name + ": not UTF-8 text");
-  }
-  return text;
-}
-
-enum class Markup { XML, HTML };
-
-Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path, Markup markup) {
-  NSXMLParseError error;
-  uint32_t mode = options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
-  if (markup == Markup::HTML) mode |= NSXMLDocumentTidyHTML;
-  const std::string name = path == "-" ? "standard input" : path;
-  Ref<NSXMLDocument> document;
-  {
-    ProgressLine line(visible(name));
-    document = NSXMLDocument::documentWithFile(
-        path, mode, &error, [&line](uint64_t bytes, uint64_t whole) { line.show(bytes, whole); });
-  }
-  if (document) return document;
-  if (error.line == 0) {
-    // The reason why a file cannot be read begins with its path.
-    const size_t named = error.message.starts_with(path + ": ") ? path.size() + 2 : 0;
-    stop(StatusInput, "xquery: " + name + ": " + error.message.substr(named));
-  }
-  stop(StatusInput, name + ":" + std::to_string(error.line) + ":" + std::to_string(error.column) +
-                        ": " + error.message);
-}
-
-XQueryConstants bindConstants(const Options& options) {
-  XQueryConstants constants;
-  for (const Binding& binding : options.variables) {
-    constants[binding.name] = XQueryUntypedAtomic(binding.value);
-  }
-  for (const Binding& binding : options.documents) {
-    constants[binding.name] = readDocument(options, binding.value, Markup::XML);
-  }
-  return constants;
-}
 
 // What a query names beside it is looked for beside its file, or in the working folder.
 Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
@@ -99,7 +24,7 @@ Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
   Ref<XQuery> query = XQuery::xqueryWithSource(source, loading, XQueryLimits(), way);
   const Ref<NSArray> errors = query->parseErrors();
   if (!errors || errors->count() == 0) return query;
-  stop(StatusQueryError, descriptions(*errors));
+  throw Failure{StatusQueryError, descriptions(*errors)};
 }
 
 // Null for a query that has no value and no error, such as a library module. A value that is an
@@ -109,34 +34,9 @@ Ref<NSArray> evaluate(XQueryContext& context, const XQuery& query, const XQueryC
   Ref<XQueryError> error;
   Ref<NSArray> items = context.evaluateXQuery(query, constants, contextItem, &error);
   if (const Ref<NSError> failure = XQueryFirstError(items, error)) {
-    stop(StatusQueryError, description(*failure));
+    throw Failure{StatusQueryError, description(*failure)};
   }
   return items;
-}
-
-void printData(std::string_view bytes, Output& output) {
-  static constexpr char digits[] = "0123456789ABCDEF";
-  for (const char byte : bytes) {
-    const auto value = static_cast<unsigned char>(byte);
-    const char pair[] = {digits[value >> 4], digits[value & 15]};
-    output.append({pair, 2});
-  }
-}
-
-void printItem(const NSObject& item, bool types, Output& output) {
-  if (types) {
-    output.append(XQueryItemTypeName(item));
-    output.append("\t");
-  }
-  if (item.isNode()) {
-    cast<NSXMLNode>(&item)->writeXML(
-        [&output](std::string_view xml) { return output.append(xml); });
-  } else if (isa<NSData>(&item)) {
-    printData(cast<NSData>(&item)->bytes(), output);
-  } else {
-    output.append(XQueryItemStringValue(item));
-  }
-  output.append("\n");
 }
 
 // Opens the output, has it written and closes it.
@@ -148,16 +48,7 @@ bool print(const Options& options, Write write) {
     write(output);
     if (output.finish()) return true;
   }
-  stop(StatusInput, "xquery: cannot write " + name + ": " + output.error());
-}
-
-bool printItems(const Options& options, const NSArray* items) {
-  return print(options, [&](Output& output) {
-    const size_t count = items ? items->count() : 0;
-    for (size_t i = 0; i < count && output.error().empty(); i++) {
-      printItem(*items->objectAtIndex(i), options.types, output);
-    }
-  });
+  throw Failure{StatusInput, "xquery: cannot write " + name + ": " + output.error()};
 }
 
 bool printPlan(const Options& options, const XQuery& query) {
@@ -189,7 +80,11 @@ void runPhases(const Options& options) {
     items =
         phases.evaluate.measure([&] { return evaluate(*context, *query, constants, contextItem); });
   }
-  phases.print.measure([&] { return printItems(options, items.get()); });
+  phases.print.measure([&] {
+    return print(options, [&](Output& output) {
+      if (items) writeItems(options, *items, output);
+    });
+  });
   if (options.time) phases.report(options.repeat > 1);
 }
 
@@ -199,8 +94,9 @@ Status run(const Options& options) {
   try {
     runPhases(options);
     return StatusResult;
-  } catch (const Stop& end) {
-    return end.status;
+  } catch (const Failure& failure) {
+    writeMessage(visible(failure.message) + "\n");
+    return failure.status;
   } catch (const std::exception& error) {
     writeMessage("xquery: " + visible(error.what()) + "\n");
     return StatusInput;

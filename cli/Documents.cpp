@@ -1,0 +1,86 @@
+#include "Documents.h"
+
+#include "Messages.h"
+#include "Progress.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <memory>
+
+namespace cli {
+namespace {
+
+using namespace xquery;
+
+struct CloseFile {
+  void operator()(std::FILE* file) const { std::fclose(file); }
+};
+
+[[noreturn]] void failReading(const std::string& path, const NSXMLParseError& error) {
+  const std::string name = inputName(path);
+  if (error.line == 0) {
+    // The reason why a file cannot be read begins with its path.
+    const size_t named = error.message.starts_with(path + ": ") ? path.size() + 2 : 0;
+    throw Failure{StatusInput, "xquery: " + name + ": " + error.message.substr(named)};
+  }
+  throw Failure{StatusInput, name + ":" + std::to_string(error.line) + ":" +
+                                 std::to_string(error.column) + ": " + error.message};
+}
+
+}  // namespace
+
+std::string readFile(const std::string& path) {
+  const std::unique_ptr<std::FILE, CloseFile> file(std::fopen(path.c_str(), "rb"));
+  std::string text;
+  char piece[65536];
+  while (const size_t count = file ? std::fread(piece, 1, sizeof piece, file.get()) : 0) {
+    text.append(piece, count);
+  }
+  // A directory opens but cannot be read.
+  if (!file || std::ferror(file.get())) {
+    throw Failure{StatusInput, "xquery: " + path + ": " + std::strerror(errno)};
+  }
+  return text;
+}
+
+Ref<NSString> queryText(const Options& options) {
+  const std::string bytes = options.queryText ? *options.queryText : readFile(options.queryFile);
+  const Ref<NSString> text = NSString::stringWithUTF8(bytes);
+  if (!text) {
+    const std::string name = options.queryText ? "the query given with -e" : options.queryFile;
+    throw Failure{StatusInput, "xquery: " + name + ": not UTF-8 text"};
+  }
+  return text;
+}
+
+std::string inputName(const std::string& path) {
+  return path == "-" ? "standard input" : path;
+}
+
+Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path, Markup markup) {
+  NSXMLParseError error;
+  uint32_t mode = options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
+  if (markup == Markup::HTML) mode |= NSXMLDocumentTidyHTML;
+  Ref<NSXMLDocument> document;
+  {
+    ProgressLine line(visible(inputName(path)));
+    document = NSXMLDocument::documentWithFile(
+        path, mode, &error, [&line](uint64_t bytes, uint64_t whole) { line.show(bytes, whole); });
+  }
+  if (!document) failReading(path, error);
+  return document;
+}
+
+XQueryConstants bindConstants(const Options& options) {
+  XQueryConstants constants;
+  for (const Binding& binding : options.variables) {
+    constants[binding.name] = XQueryUntypedAtomic(binding.value);
+  }
+  for (const Binding& binding : options.documents) {
+    constants[binding.name] = readDocument(options, binding.value, Markup::XML);
+  }
+  return constants;
+}
+
+}  // namespace cli
