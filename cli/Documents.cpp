@@ -17,6 +17,17 @@ struct CloseFile {
   void operator()(std::FILE* file) const { std::fclose(file); }
 };
 
+// A directory opens but cannot be read.
+std::string readAll(std::FILE* file, const std::string& name) {
+  std::string text;
+  char piece[65536];
+  while (const size_t count = file ? std::fread(piece, 1, sizeof piece, file) : 0) {
+    text.append(piece, count);
+  }
+  if (file && !std::ferror(file)) return text;
+  throw Failure{StatusInput, "xquery: " + name + ": " + std::strerror(errno)};
+}
+
 [[noreturn]] void failReading(const std::string& path, const NSXMLParseError& error) {
   const std::string name = inputName(path);
   if (error.line == 0) {
@@ -32,16 +43,11 @@ struct CloseFile {
 
 std::string readFile(const std::string& path) {
   const std::unique_ptr<std::FILE, CloseFile> file(std::fopen(path.c_str(), "rb"));
-  std::string text;
-  char piece[65536];
-  while (const size_t count = file ? std::fread(piece, 1, sizeof piece, file.get()) : 0) {
-    text.append(piece, count);
-  }
-  // A directory opens but cannot be read.
-  if (!file || std::ferror(file.get())) {
-    throw Failure{StatusInput, "xquery: " + path + ": " + std::strerror(errno)};
-  }
-  return text;
+  return readAll(file.get(), path);
+}
+
+std::string readStandardInput() {
+  return readAll(stdin, inputName("-"));
 }
 
 Ref<NSString> queryText(const Options& options) {

@@ -16,6 +16,7 @@ struct Failure {
 
 // The bytes of a file; throws Failure.
 std::string readFile(const std::string& path);
+std::string readStandardInput();
 
 // The query, as -e or its file gives it; throws Failure.
 xquery::Ref<xquery::NSString> queryText(const Options& options);

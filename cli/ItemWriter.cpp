@@ -7,36 +7,46 @@ namespace {
 
 using namespace xquery;
 
-void writeData(std::string_view bytes, Output& output) {
+void writeData(std::string_view bytes, ResultPart& result) {
   static constexpr char digits[] = "0123456789ABCDEF";
   for (const char byte : bytes) {
     const auto value = static_cast<unsigned char>(byte);
     const char pair[] = {digits[value >> 4], digits[value & 15]};
-    output.append({pair, 2});
+    result.append({pair, 2});
   }
 }
 
-void writeItem(const NSObject& item, bool types, Output& output) {
+void writeItem(const NSObject& item, bool types, ResultPart& result) {
   if (types) {
-    output.append(XQueryItemTypeName(item));
-    output.append("\t");
+    result.append(XQueryItemTypeName(item));
+    result.append("\t");
   }
   if (item.isNode()) {
     cast<NSXMLNode>(&item)->writeXML(
-        [&output](std::string_view xml) { return output.append(xml); });
+        [&result](std::string_view xml) { return result.append(xml); });
   } else if (isa<NSData>(&item)) {
-    writeData(cast<NSData>(&item)->bytes(), output);
+    writeData(cast<NSData>(&item)->bytes(), result);
   } else {
-    output.append(XQueryItemStringValue(item));
+    result.append(XQueryItemStringValue(item));
   }
-  output.append("\n");
+  result.append("\n");
 }
 
 }  // namespace
 
-void writeItems(const Options& options, const NSArray& items, Output& output) {
-  for (size_t i = 0; i < items.count() && output.error().empty(); i++) {
-    writeItem(*items.objectAtIndex(i), options.types, output);
+Framing framing(const Options&) {
+  return {};
+}
+
+void writeItems(const Options& options, const std::string& inputName, const NSArray& items,
+                ResultPart& result) {
+  for (size_t i = 0; i < items.count() && !result.isStopped(); i++) {
+    result.beginItem();
+    if (options.withName) {
+      result.append(inputName);
+      result.append("\t");
+    }
+    writeItem(*items.objectAtIndex(i), options.types, result);
   }
 }
 

@@ -2,12 +2,15 @@
 #pragma once
 
 #include "Options.h"
-#include "Output.h"
+#include "Results.h"
 #include "xquery/xquery.h"
 
 namespace cli {
 
-// Stops at the first failed write.
-void writeItems(const Options& options, const xquery::NSArray& items, Output& output);
+Framing framing(const Options& options);
+
+// Stops at the first failed write. `inputName` is what --with-name puts before each item.
+void writeItems(const Options& options, const std::string& inputName, const xquery::NSArray& items,
+                ResultPart& result);
 
 }  // namespace cli

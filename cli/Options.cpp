@@ -7,6 +7,7 @@
 
 #include <CLI/CLI.hpp>
 
+#include <algorithm>
 #include <memory>
 #include <sstream>
 
@@ -16,7 +17,8 @@ namespace {
 constexpr const char* footer =
     "QUERYFILE is a file in UTF-8; -e gives the query itself. INPUT is the document that becomes "
     "the\n"
-    "context item, \"-\" stands for standard input; without INPUT there is no context item.\n\n"
+    "context item, \"-\" stands for standard input; without INPUT there is no context item. With\n"
+    "several INPUTs, or a folder of them, the query is evaluated for each on its own.\n\n"
     "Exit status: 0 for a result, 1 for an error in the query, 2 for wrong usage, 3 for input "
     "that\n"
     "cannot be read or parsed or output that cannot be written.";
@@ -25,8 +27,8 @@ constexpr const char* footer =
 class Help : public CLI::Formatter {
  public:
   std::string make_usage(const CLI::App*, std::string) const override {
-    return "Usage: xquery [options] QUERYFILE [INPUT]\n"
-           "       xquery [options] -e QUERY [INPUT]\n";
+    return "Usage: xquery [options] QUERYFILE [INPUT...]\n"
+           "       xquery [options] -e QUERY [INPUT...]\n";
   }
   // The value belongs to the name where it may be left out.
   std::string make_option_name(const CLI::Option* option, bool isPositional) const override {
@@ -69,8 +71,11 @@ void declareOptions(CLI::App& app) {
   app.footer(footer);
   app.set_version_flag("--version", "xquery " XQUERY_VERSION);
   for (const OptionRow& row : optionRows()) declareOption(app, row);
-  addTexts(app, "first", "")->group("");
-  addTexts(app, "second", "")->group("");
+  addTexts(app, "arguments", "")
+      ->expected(0, CLI::detail::expected_max_vector_size)
+      ->allow_extra_args()
+      ->take_all()
+      ->group("");
 }
 
 void applyOptions(const CLI::App& app, Options& options) {
@@ -86,18 +91,18 @@ void applyOptions(const CLI::App& app, Options& options) {
 
 // Gives the positional arguments their meaning.
 void interpretArguments(const CLI::App& app, Options& options) {
-  std::vector<std::string> arguments;
-  for (const char* place : {"first", "second"}) {
-    const std::vector<std::string>& given = app.get_option(place)->results();
-    arguments.insert(arguments.end(), given.begin(), given.end());
-  }
-  size_t next = 0;
-  if (!options.queryText) {
-    if (arguments.empty()) throw WrongUsage("QUERYFILE or -e QUERY is required");
-    options.queryFile = arguments[next++];
-  }
-  if (next < arguments.size()) options.input = arguments[next++];
-  if (next < arguments.size()) throw CLI::ExtrasError({arguments[next]});
+  options.inputs = app.get_option("arguments")->results();
+  if (options.queryText) return;
+  if (options.inputs.empty()) throw WrongUsage("QUERYFILE or -e QUERY is required");
+  options.queryFile = options.inputs.front();
+  options.inputs.erase(options.inputs.begin());
+}
+
+void checkStandardInput(const Options& options) {
+  auto readers = std::count(options.inputs.begin(), options.inputs.end(), "-");
+  readers += options.filesFrom == "-";
+  for (const Binding& document : options.documents) readers += document.value == "-";
+  if (readers > 1) throw WrongUsage("standard input can be read only once");
 }
 
 // Help and version are output like any other.
@@ -126,6 +131,7 @@ std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
     app.parse(argc, argv);
     applyOptions(app, options);
     interpretArguments(app, options);
+    checkStandardInput(options);
   } catch (const CLI::Success& success) {
     return print(app, success);
   } catch (const CLI::ParseError& error) {

@@ -26,7 +26,8 @@ struct Binding {
 struct Options {
   std::optional<std::string> queryText;   // -e
   std::string queryFile;                  // used when there is no text
-  std::optional<std::string> input;       // none: no context item; "-": standard input
+  std::vector<std::string> inputs;        // files and folders; "-": standard input
+  std::optional<std::string> filesFrom;   // a file with names of more
   std::optional<std::string> outputFile;  // none: standard output
   std::vector<Binding> variables;
   std::vector<Binding> documents;
@@ -37,6 +38,11 @@ struct Options {
   bool time = false;
   std::optional<xquery::XQueryPlanFormat> plan;  // to be shown instead of the result
   unsigned repeat = 1;
+  unsigned jobs = 0;  // 0: as many as there are processors
+  bool withName = false;
+
+  // Without any there is no context item.
+  bool hasInputs() const { return !inputs.empty() || filesFrom; }
 };
 
 // Fills `options`. A status means that the command ends here: help or version was printed, or the

@@ -4,8 +4,13 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <numeric>
 
 namespace cli {
+
+void Phase::add(const Phase& other) {
+  _milliseconds.insert(_milliseconds.end(), other._milliseconds.begin(), other._milliseconds.end());
+}
 
 std::string Phase::report(bool statistics) const {
   std::vector<double> sorted = _milliseconds;
@@ -20,9 +25,17 @@ std::string Phase::report(bool statistics) const {
     std::snprintf(line, sizeof line, "%-9s median %10.3f ms  minimum %10.3f ms\n", _name, median,
                   minimum);
   } else {
-    std::snprintf(line, sizeof line, "%-9s %10.3f ms\n", _name, median);
+    std::snprintf(line, sizeof line, "%-9s %10.3f ms\n", _name,
+                  std::accumulate(sorted.begin(), sorted.end(), 0.0));
   }
   return line;
+}
+
+void Phases::add(const Phases& other) {
+  parse.add(other.parse);
+  compile.add(other.compile);
+  evaluate.add(other.evaluate);
+  print.add(other.print);
 }
 
 void Phases::report(bool statistics) const {

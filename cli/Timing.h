@@ -23,7 +23,9 @@ class Phase {
     return result;
   }
 
-  // One line: the time, or with `statistics` the median and the minimum.
+  void add(const Phase& other);
+
+  // One line: the time in sum, or with `statistics` the median and the minimum.
   std::string report(bool statistics) const;
 
  private:
@@ -34,6 +36,7 @@ class Phase {
 struct Phases {
   Phase parse{"parse"}, compile{"compile"}, evaluate{"evaluate"}, print{"print"};
 
+  void add(const Phases& other);
   void report(bool statistics) const;
 };
 

@@ -95,8 +95,9 @@ INSTANTIATE_TEST_SUITE_P(
     testing::Values(
         WrongUsage{"UnknownOption", {"--bogus", "-e", "1"}, "--bogus"},
         WrongUsage{"NoQuery", {}, "QUERYFILE"},
-        WrongUsage{"TooManyArguments", {"a.xq", "b.xml", "c"}, "c"},
-        WrongUsage{"TooManyArgumentsWithText", {"-e", "1", "b.xml", "c"}, "c"},
+        WrongUsage{"StandardInputTwice", {"-e", "1", "-", "-"}, "standard input"},
+        WrongUsage{"StandardInputAsListToo", {"-e", "1", "-", "--files-from", "-"}, "only once"},
+        WrongUsage{"NoJobs", {"-e", "1", "--jobs", "0"}, "--jobs: expected a number from 1"},
         WrongUsage{"TextWithoutText", {"-e"}, "-e"},
         WrongUsage{"TextTwice", {"-e", "1", "-e", "2"}, "-e"},
         WrongUsage{"VariableWithoutValue", {"--var", "x", "-e", "1"}, "--var"},
@@ -182,11 +183,11 @@ TEST(ExitStatus, AnInputWithoutANameIsThree) {
   EXPECT_EQ(xquery({"-e", "1", ""}).status, 3);
 }
 
-TEST(ExitStatus, ADirectoryAsInputIsThree) {
+TEST(ExitStatus, AFolderWithoutDocumentsIsThree) {
   const TemporaryDirectory directory;
   const Outcome outcome = xquery({"-e", "1", directory.path("")});
   EXPECT_EQ(outcome.status, 3);
-  EXPECT_EQ(outcome.err, "xquery: " + directory.path("") + ": Is a directory\n");
+  EXPECT_EQ(outcome.err, "xquery: " + directory.path("") + ": no XML files in this folder\n");
 }
 
 TEST(ExitStatus, ADirectoryAsADocumentForAVariableIsThree) {

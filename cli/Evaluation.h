@@ -1,0 +1,27 @@
+// The query, compiled and evaluated for one input after the other.
+#pragma once
+
+#include "Options.h"
+#include "xquery/xquery.h"
+
+namespace cli {
+
+// Throws Failure.
+xquery::Ref<xquery::XQuery> compile(const Options& options,
+                                    const xquery::Ref<xquery::NSString>& source);
+
+// In a context of its own, so that no evaluation knows of another; but one that is repeated keeps
+// its context. Null for a query that has no value and no error, such as a library module. Throws
+// Failure; a value that is an error counts as one wherever it stands.
+class Evaluation {
+ public:
+  explicit Evaluation(const Options& options);
+  xquery::Ref<xquery::NSArray> evaluate(const xquery::XQuery& query,
+                                        const xquery::XQueryConstants& constants,
+                                        const xquery::Value& contextItem);
+
+ private:
+  const xquery::Ref<xquery::XQueryContext> _context;
+};
+
+}  // namespace cli

@@ -1,0 +1,24 @@
+// The documents that a query is evaluated for: files, what folders hold, lists of names.
+#pragma once
+
+#include "Options.h"
+
+#include <string>
+#include <vector>
+
+namespace cli {
+
+struct Input {
+  std::string path;     // "-": standard input
+  std::string failure;  // why there is nothing to be read, such as of a folder; usually empty
+};
+
+// In the order that they are given; those of a folder by their names. Throws Failure where the
+// list of names cannot be read.
+//
+// Of a folder and the folders below it, those files are taken whose names end as those of such
+// documents do, packed or not; what begins with a dot is left out, and links to folders are not
+// followed.
+std::vector<Input> inputsOf(const Options& options);
+
+}  // namespace cli

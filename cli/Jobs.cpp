@@ -1,0 +1,134 @@
+#include "Jobs.h"
+
+#include "Documents.h"
+#include "Evaluation.h"
+#include "ItemWriter.h"
+#include "Results.h"
+#include "Stack.h"
+
+#include <algorithm>
+#include <atomic>
+#include <deque>
+#include <mutex>
+#include <thread>
+
+namespace cli {
+namespace {
+
+using namespace xquery;
+
+unsigned numberOfJobs(const Options& options, size_t inputs) {
+  const unsigned wanted =
+      options.jobs > 0 ? options.jobs : std::max(1U, std::thread::hardware_concurrency());
+  return static_cast<unsigned>(std::clamp<size_t>(inputs, 1, wanted));
+}
+
+class Jobs {
+ public:
+  Jobs(const Options& options, const XQuery& query, const XQueryConstants& constants,
+       const std::optional<std::vector<Input>>& inputs, Phases& phases)
+      : _options(options),
+        _query(query),
+        _constants(constants),
+        _inputs(inputs),
+        _parts(inputs ? inputs->size() : 1),
+        _jobs(numberOfJobs(options, _parts)),
+        _results(options, framing(options), _jobs),
+        _phases(phases) {}
+
+  Status run();
+
+ private:
+  // Takes one part after the other until there are no more; on each thread.
+  void work();
+  void makePart(size_t number, Phases& phases);
+  Ref<NSArray> resultOf(const Input* input, Phases& phases) const;
+  // What is said about one of several inputs names it.
+  std::string named(const Input* input, const Failure& failure) const;
+
+  const Options& _options;
+  const XQuery& _query;
+  const XQueryConstants& _constants;
+  const std::optional<std::vector<Input>>& _inputs;
+  const size_t _parts;
+  const unsigned _jobs;
+  Results _results;
+  std::atomic<size_t> _next = 0;
+  std::mutex _mutex;
+  Phases& _phases;
+};
+
+// This thread works too, so that all is done even where no other can be started.
+Status Jobs::run() {
+  const std::function<void()> each = [this] { work(); };
+  std::vector<pthread_t> threads;
+  while (threads.size() + 1 < _jobs) {
+    const auto thread = startWithLargeStack(each, _jobs);
+    if (!thread) break;
+    threads.push_back(*thread);
+  }
+  work();
+  for (const pthread_t thread : threads) pthread_join(thread, nullptr);
+  if (_results.finish(_parts)) return _results.status();
+  const std::string name = _options.outputFile.value_or("standard output");
+  throw Failure{StatusInput, "xquery: cannot write " + name + ": " + _results.error()};
+}
+
+void Jobs::work() {
+  Phases phases;
+  for (size_t number = _next++; number < _parts && _results.begin(number); number = _next++) {
+    makePart(number, phases);
+  }
+  const std::lock_guard lock(_mutex);
+  _phases.add(phases);
+}
+
+void Jobs::makePart(size_t number, Phases& phases) {
+  const Input* const input = _inputs ? &(*_inputs)[number] : nullptr;
+  ResultPart part(_results, number);
+  try {
+    const Ref<NSArray> items = resultOf(input, phases);
+    phases.print.measure([&] {
+      part.begin();
+      if (items) writeItems(_options, input ? inputName(input->path) : "", *items, part);
+      part.end();
+      return true;
+    });
+  } catch (const Failure& failure) {
+    part.end(failure.status, named(input, failure));
+  } catch (const std::exception& error) {
+    part.end(StatusInput, "xquery: " + std::string(error.what()));
+  }
+}
+
+Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) const {
+  if (input && !input->failure.empty()) {
+    throw Failure{StatusInput, "xquery: " + input->path + ": " + input->failure};
+  }
+  const Value contextItem = phases.parse.measure([&]() -> Value {
+    if (!input) return nullptr;
+    return readDocument(_options, input->path, _options.html ? Markup::HTML : Markup::XML);
+  });
+  Evaluation evaluation(_options);
+  Ref<NSArray> items;
+  for (unsigned n = 0; n < _options.repeat; n++) {
+    items = nullptr;
+    items = phases.evaluate.measure(
+        [&] { return evaluation.evaluate(_query, _constants, contextItem); });
+  }
+  return items;
+}
+
+std::string Jobs::named(const Input* input, const Failure& failure) const {
+  if (_parts < 2 || failure.status != StatusQueryError) return failure.message;
+  return inputName(input->path) + ": " + failure.message;
+}
+
+}  // namespace
+
+Status runJobs(const Options& options, const XQuery& query, const XQueryConstants& constants,
+               const std::optional<std::vector<Input>>& inputs, Phases& phases) {
+  return Jobs(options, query, constants, inputs, phases).run();
+}
+
+}  // namespace cli

@@ -1,0 +1,21 @@
+// One compiled query, evaluated for every input: by several threads where there are several.
+#pragma once
+
+#include "Inputs.h"
+#include "Options.h"
+#include "Timing.h"
+#include "xquery/xquery.h"
+
+#include <optional>
+#include <vector>
+
+namespace cli {
+
+// Without inputs, nothing stands for evaluating once without a context item. Each input that fails
+// is reported, and the others go on. Answers the gravest status; throws Failure for output that
+// cannot be written.
+[[nodiscard]] Status runJobs(const Options& options, const xquery::XQuery& query,
+                             const xquery::XQueryConstants& constants,
+                             const std::optional<std::vector<Input>>& inputs, Phases& phases);
+
+}  // namespace cli
