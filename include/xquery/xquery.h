@@ -10,6 +10,7 @@
 #include "xquery/Memory.h"
 #include "xquery/Number.h"
 #include "xquery/Object.h"
+#include "xquery/Serializing.h"
 #include "xquery/String.h"
 #include "xquery/URL.h"
 #include "xquery/XMLNode.h"

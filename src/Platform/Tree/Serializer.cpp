@@ -23,6 +23,7 @@
 #include "Platform/Tree/Names.h"
 #include "Platform/Tree/ReservedNamespaces.h"
 #include "Platform/Tree/XMLOutput.h"
+#include "xquery/Serializing.h"
 #include "xquery/XMLNode.h"
 
 #include <algorithm>
@@ -166,16 +167,65 @@ void dropRepeated(std::vector<WrittenAttribute>& attributes) {
   });
 }
 
+// --- lines and indentation -------------------------------------------------------------------
+
+bool isBlank(NSStringView text) {
+  for (uint32_t i = 0; i < text.length(); ++i) {
+    const char16_t unit = text[i];
+    if (unit != ' ' && unit != '\t' && unit != '\n' && unit != '\r') return false;
+  }
+  return true;
+}
+
+// Which children get lines of their own: those of elements without text of their own, unless an
+// element around them has.
+class Layout {
+ public:
+  void open(const NSXMLNode* branch) {
+    const bool isAllowed = _levels.empty() || _levels.back();
+    _levels.push_back(isAllowed && hasLinesWithin(branch));
+  }
+  void close() { _levels.pop_back(); }
+  bool hasLines() const { return !_levels.empty() && _levels.back(); }
+  size_t depth() const { return _levels.size(); }
+
+ private:
+  static bool hasLinesWithin(const NSXMLNode* branch) {
+    if (const auto* element = dyn_cast<NSXMLElement>(branch)) {
+      const NSXMLNode* space =
+          element->attributeForLocalName(ascii("space"), ascii(namespaceOfXML));
+      if (space && space->textView() == "preserve") return false;
+    }
+    bool hasOthers = false;
+    WorkPacer pacer;
+    for (const NSXMLNode* child = branch->firstChild(); child; child = child->nextSibling()) {
+      pacer.turn();
+      const bool isText = child->kind() == Kind::Text;
+      if (isText && (NSXMLTree::isCDATA(child) || !isBlank(child->textView()))) return false;
+      hasOthers |= !isText;
+    }
+    return hasOthers;
+  }
+
+  std::vector<bool> _levels;  // for each open branch
+};
+
 // --- the walk --------------------------------------------------------------------------------
+
+enum class Lines { AsTheyAre, Indented };
 
 class Serializer {
  public:
-  Serializer(const NSXMLNode* root, XMLOutput& out) : _root(root), _out(out) {}
+  Serializer(const NSXMLNode* root, XMLOutput& out, Lines lines = Lines::AsTheyAre)
+      : _root(root), _out(out), _lines(lines) {}
   void run();
 
  private:
   void open(const NSXMLNode* node);
   void close(const NSXMLNode* node);
+  // Whether the node is white space that the layout has none of.
+  bool layOut(const NSXMLNode* node);
+  void startLine(size_t depth);
   void writeLeaf(const NSXMLNode* node);
   void writeStartTag(const NSXMLElement* element);
   void writeName(const NSXMLNode* element, NSStringView prefix);
@@ -200,6 +250,8 @@ class Serializer {
 
   const NSXMLNode* _root;
   XMLOutput& _out;
+  const Lines _lines;
+  Layout _layout;  // where lines are indented
   NamespaceScope _scope;
   std::vector<Declaration> _declared;         // in the start tag at hand
   std::vector<WrittenAttribute> _attributes;  // in the same
@@ -229,7 +281,26 @@ void Serializer::run() {
   _out.flush();
 }
 
+void Serializer::startLine(size_t depth) {
+  _out.write('\n');
+  for (size_t level = 0; level < depth; ++level) _out.write("  ");
+}
+
+// Nothing stands before the document's first child, whose declaration ends with a line feed.
+bool Serializer::layOut(const NSXMLNode* node) {
+  if (_lines == Lines::AsTheyAre) return false;
+  if (_layout.hasLines()) {
+    if (node->kind() == Kind::Text) return true;
+    const bool isInDocument = node->parent()->kind() == Kind::Document;
+    const size_t depth = _layout.depth() - (_root->kind() == Kind::Document);
+    if (!isInDocument || node->previousSibling()) startLine(depth);
+  }
+  if (node->firstChild()) _layout.open(node);
+  return false;
+}
+
 void Serializer::open(const NSXMLNode* node) {
+  if (layOut(node)) return;
   if (const auto* element = dyn_cast<NSXMLElement>(node)) {
     writeStartTag(element);
   } else if (node->kind() == Kind::Document) {
@@ -240,6 +311,12 @@ void Serializer::open(const NSXMLNode* node) {
 }
 
 void Serializer::close(const NSXMLNode* node) {
+  if (_lines == Lines::Indented) {
+    const bool hadLines = _layout.hasLines();
+    _layout.close();
+    const size_t depth = _layout.depth() - (_root->kind() == Kind::Document);
+    if (hadLines && node->kind() == Kind::Element) startLine(depth);
+  }
   if (node->kind() != Kind::Element) return;
   _out.write("</");
   if (!_renamed.empty() && _renamed.back().first == node) {
@@ -508,6 +585,13 @@ void NSXMLNode::writeXML(const std::function<bool(std::string_view)>& write) con
   std::string buffer;
   XMLOutput out(buffer, &write);
   Serializer(this, out).run();
+}
+
+void XQueryWriteIndentedXML(const NSXMLNode& node,
+                            const std::function<bool(std::string_view)>& write) {
+  std::string buffer;
+  XMLOutput out(buffer, &write);
+  Serializer(&node, out, Lines::Indented).run();
 }
 
 Ref<NSString> NSXMLNode::XMLString() const {
