@@ -1,12 +1,15 @@
 #include "Documents.h"
 
+#include "Inputs.h"
 #include "Messages.h"
 #include "Progress.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
 #include <memory>
+#include <optional>
 
 namespace cli {
 namespace {
@@ -25,7 +28,12 @@ std::string readAll(std::FILE* file, const std::string& name) {
     text.append(piece, count);
   }
   if (file && !std::ferror(file)) return text;
-  throw Failure{StatusInput, "xquery: " + name + ": " + std::strerror(errno)};
+  throw Failure{StatusInput, "xquery: " + name + ": " + std::strerror(errno), {}};
+}
+
+// Several inputs at a time would write over each other's line.
+bool showsProgress(const Options& options) {
+  return !options.quiet && (options.progress || options.inputs.size() + !!options.filesFrom < 2);
 }
 
 [[noreturn]] void failReading(const std::string& path, const NSXMLParseError& error) {
@@ -33,10 +41,12 @@ std::string readAll(std::FILE* file, const std::string& name) {
   if (error.line == 0) {
     // The reason why a file cannot be read begins with its path.
     const size_t named = error.message.starts_with(path + ": ") ? path.size() + 2 : 0;
-    throw Failure{StatusInput, "xquery: " + name + ": " + error.message.substr(named)};
+    throw Failure{StatusInput, "xquery: " + name + ": " + error.message.substr(named), {}};
   }
-  throw Failure{StatusInput, name + ":" + std::to_string(error.line) + ":" +
-                                 std::to_string(error.column) + ": " + error.message};
+  throw Failure{StatusInput,
+                name + ":" + std::to_string(error.line) + ":" + std::to_string(error.column) +
+                    ": " + error.message,
+                {}};
 }
 
 }  // namespace
@@ -50,12 +60,25 @@ std::string readStandardInput() {
   return readAll(stdin, inputName("-"));
 }
 
+// A script's first line, which names the command to the system, is for the query a blank one.
+static std::string withoutInterpreter(std::string text) {
+  if (text.starts_with("#!")) text.erase(0, std::min(text.find('\n'), text.size()));
+  return text;
+}
+
+static std::string queryBytes(const Options& options) {
+  if (options.queryText) return *options.queryText;
+  return withoutInterpreter(options.queryFile == "-" ? readStandardInput()
+                                                     : readFile(options.queryFile));
+}
+
 Ref<NSString> queryText(const Options& options) {
-  const std::string bytes = options.queryText ? *options.queryText : readFile(options.queryFile);
+  const std::string bytes = queryBytes(options);
   const Ref<NSString> text = NSString::stringWithUTF8(bytes);
   if (!text) {
-    const std::string name = options.queryText ? "the query given with -e" : options.queryFile;
-    throw Failure{StatusInput, "xquery: " + name + ": not UTF-8 text"};
+    const std::string name =
+        options.queryText ? "the query given with -e" : inputName(options.queryFile);
+    throw Failure{StatusInput, "xquery: " + name + ": not UTF-8 text", {}};
   }
   return text;
 }
@@ -68,12 +91,14 @@ Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path,
   NSXMLParseError error;
   uint32_t mode = options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
   if (markup == Markup::HTML) mode |= NSXMLDocumentTidyHTML;
-  Ref<NSXMLDocument> document;
-  {
-    ProgressLine line(visible(inputName(path)));
-    document = NSXMLDocument::documentWithFile(
-        path, mode, &error, [&line](uint64_t bytes, uint64_t whole) { line.show(bytes, whole); });
+  NSXMLReadingProgress progress;
+  std::optional<ProgressLine> line;
+  if (showsProgress(options)) {
+    line.emplace(visible(inputName(path)));
+    progress = [&line](uint64_t bytes, uint64_t whole) { line->show(bytes, whole); };
   }
+  const Ref<NSXMLDocument> document = NSXMLDocument::documentWithFile(path, mode, &error, progress);
+  line.reset();
   if (!document) failReading(path, error);
   return document;
 }
@@ -84,7 +109,9 @@ XQueryConstants bindConstants(const Options& options) {
     constants[binding.name] = XQueryUntypedAtomic(binding.value);
   }
   for (const Binding& binding : options.documents) {
-    constants[binding.name] = readDocument(options, binding.value, Markup::XML);
+    const bool isHTML = options.html && !isNamedXML(binding.value);
+    constants[binding.name] =
+        readDocument(options, binding.value, isHTML ? Markup::HTML : Markup::XML);
   }
   return constants;
 }

@@ -5,13 +5,15 @@
 #include "xquery/xquery.h"
 
 #include <string>
+#include <vector>
 
 namespace cli {
 
 // Ends what is under way with a status; the message is for standard error.
 struct Failure {
-  Status status;
+  Status status = StatusInput;
   std::string message;
+  std::vector<xquery::Ref<xquery::NSError>> errors;  // that it describes, of the query
 };
 
 // The bytes of a file; throws Failure.

@@ -24,4 +24,7 @@ class Evaluation {
   const xquery::Ref<xquery::XQueryContext> _context;
 };
 
+// Whether a result, null for none, is neither empty nor false.
+bool isTrue(const xquery::NSArray* items);
+
 }  // namespace cli

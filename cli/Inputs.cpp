@@ -28,9 +28,7 @@ std::string_view withoutEnding(std::string_view name, const std::string_view (&e
 bool isWanted(const fs::directory_entry& entry, bool html) {
   const std::string name = entry.path().filename().string();
   const std::string_view unpacked = withoutEnding(std::string_view(name), packings);
-  const std::string_view base =
-      html ? withoutEnding(unpacked, endingsOfHTML) : withoutEnding(unpacked, endingsOfXML);
-  return base != unpacked;
+  return html ? withoutEnding(unpacked, endingsOfHTML) != unpacked : isNamedXML(name);
 }
 
 bool isHidden(const fs::directory_entry& entry) {
@@ -93,6 +91,11 @@ void addList(const Options& options, const std::string& list, std::vector<Input>
 }
 
 }  // namespace
+
+bool isNamedXML(const std::string& path) {
+  const std::string_view unpacked = withoutEnding(std::string_view(path), packings);
+  return withoutEnding(unpacked, endingsOfXML) != unpacked;
+}
 
 std::vector<Input> inputsOf(const Options& options) {
   std::vector<Input> inputs;

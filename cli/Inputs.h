@@ -13,6 +13,9 @@ struct Input {
   std::string failure;  // why there is nothing to be read, such as of a folder; usually empty
 };
 
+// Whether the name of the file says that it is XML, packed or not.
+bool isNamedXML(const std::string& path);
+
 // In the order that they are given; those of a folder by their names. Throws Failure where the
 // list of names cannot be read.
 //

@@ -3,7 +3,9 @@
 #include "Documents.h"
 #include "Evaluation.h"
 #include "ItemWriter.h"
+#include "Reports.h"
 #include "Results.h"
+#include "Signals.h"
 #include "Stack.h"
 
 #include <algorithm>
@@ -39,12 +41,13 @@ class Jobs {
   Status run();
 
  private:
+  Status status();
   // Takes one part after the other until there are no more; on each thread.
   void work();
   void makePart(size_t number, Phases& phases);
   Ref<NSArray> resultOf(const Input* input, Phases& phases) const;
   // What is said about one of several inputs names it.
-  std::string named(const Input* input, const Failure& failure) const;
+  std::string reported(const Input* input, const Failure& failure) const;
 
   const Options& _options;
   const XQuery& _query;
@@ -53,6 +56,7 @@ class Jobs {
   const size_t _parts;
   const unsigned _jobs;
   Results _results;
+  std::atomic<bool> _isAnyTrue = false;
   std::atomic<size_t> _next = 0;
   std::mutex _mutex;
   Phases& _phases;
@@ -69,9 +73,16 @@ Status Jobs::run() {
   }
   work();
   for (const pthread_t thread : threads) pthread_join(thread, nullptr);
-  if (_results.finish(_parts)) return _results.status();
+  endIfInterrupted();
+  if (_results.finish(_parts)) return status();
   const std::string name = _options.outputFile.value_or("standard output");
-  throw Failure{StatusInput, "xquery: cannot write " + name + ": " + _results.error()};
+  throw Failure{StatusInput, "xquery: cannot write " + name + ": " + _results.error(), {}};
+}
+
+Status Jobs::status() {
+  const Status gravest = _results.status();
+  const bool isFalse = _options.exitStatus && !_isAnyTrue;
+  return gravest == StatusResult && isFalse ? StatusFalse : gravest;
 }
 
 void Jobs::work() {
@@ -88,22 +99,25 @@ void Jobs::makePart(size_t number, Phases& phases) {
   ResultPart part(_results, number);
   try {
     const Ref<NSArray> items = resultOf(input, phases);
+    if (_options.exitStatus && isTrue(items.get())) _isAnyTrue = true;
     phases.print.measure([&] {
       part.begin();
-      if (items) writeItems(_options, input ? inputName(input->path) : "", *items, part);
+      if (items) ItemWriter(_options, input ? inputName(input->path) : "", part).write(*items);
       part.end();
       return true;
     });
   } catch (const Failure& failure) {
-    part.end(failure.status, named(input, failure));
+    if (interruption()->load()) return _results.stop();
+    part.end(failure.status, reported(input, failure));
   } catch (const std::exception& error) {
-    part.end(StatusInput, "xquery: " + std::string(error.what()));
+    part.end(StatusInput,
+             reported(input, {StatusInput, std::string("xquery: ") + error.what(), {}}));
   }
 }
 
 Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) const {
   if (input && !input->failure.empty()) {
-    throw Failure{StatusInput, "xquery: " + input->path + ": " + input->failure};
+    throw Failure{StatusInput, "xquery: " + input->path + ": " + input->failure, {}};
   }
   const Value contextItem = phases.parse.measure([&]() -> Value {
     if (!input) return nullptr;
@@ -116,12 +130,12 @@ Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) const {
     items = phases.evaluate.measure(
         [&] { return evaluation.evaluate(_query, _constants, contextItem); });
   }
+  if (interruption()->load()) throw Failure{};
   return items;
 }
 
-std::string Jobs::named(const Input* input, const Failure& failure) const {
-  if (_parts < 2 || failure.status != StatusQueryError) return failure.message;
-  return inputName(input->path) + ": " + failure.message;
+std::string Jobs::reported(const Input* input, const Failure& failure) const {
+  return report(_options, failure, _parts > 1 ? inputName(input->path) : "");
 }
 
 }  // namespace

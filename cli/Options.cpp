@@ -1,5 +1,6 @@
 #include "Options.h"
 
+#include "Completions.h"
 #include "Messages.h"
 #include "OptionsTable.h"
 #include "Output.h"
@@ -71,6 +72,8 @@ void declareOptions(CLI::App& app) {
   app.footer(footer);
   app.set_version_flag("--version", "xquery " XQUERY_VERSION);
   for (const OptionRow& row : optionRows()) declareOption(app, row);
+  // For whoever packs or installs the command.
+  addTexts(app, "--completions", "")->group("");
   addTexts(app, "arguments", "")
       ->expected(0, CLI::detail::expected_max_vector_size)
       ->allow_extra_args()
@@ -98,23 +101,91 @@ void interpretArguments(const CLI::App& app, Options& options) {
   options.inputs.erase(options.inputs.begin());
 }
 
+void checkTogether(const Options& options) {
+  const bool isWhole = options.format == Format::XML || options.format == Format::JSON;
+  if (isWhole && options.separator) {
+    throw WrongUsage("--separator does not go with --as xml and --as json");
+  }
+  if (options.indent && (options.format == Format::HTML || options.format == Format::Text)) {
+    throw WrongUsage("--indent does not go with --as html and --as text");
+  }
+}
+
 void checkStandardInput(const Options& options) {
   auto readers = std::count(options.inputs.begin(), options.inputs.end(), "-");
   readers += options.filesFrom == "-";
+  readers += !options.queryText && options.queryFile == "-";
   for (const Binding& document : options.documents) readers += document.value == "-";
   if (readers > 1) throw WrongUsage("standard input can be read only once");
 }
 
-// Help and version are output like any other.
+// Help and the like are output as any other.
+Status print(const std::string& text) {
+  Output output;
+  if (output.open(std::nullopt) && output.append(text) && output.finish()) return StatusResult;
+  writeMessage("xquery: cannot write standard output: " + output.error() + "\n");
+  return StatusInput;
+}
+
 Status print(const CLI::App& app, const CLI::Success& request) {
   std::ostringstream text;
   app.exit(request, text, text);
-  Output output;
-  if (output.open(std::nullopt) && output.append(text.str()) && output.finish()) {
-    return StatusResult;
+  return print(text.str());
+}
+
+Status printCompletions(const std::string& shell) {
+  const std::optional<std::string> script = completions(shell);
+  if (!script) throw WrongUsage("--completions: expected bash, zsh or fish, not \"" + shell + "\"");
+  return print(*script);
+}
+
+// How many letters have to be put in, taken away or changed to make one text of the other, and
+// neighbours to be swapped.
+size_t distance(std::string_view a, std::string_view b) {
+  std::vector<std::vector<size_t>> steps(a.size() + 1, std::vector<size_t>(b.size() + 1));
+  for (size_t i = 0; i <= a.size(); ++i) {
+    for (size_t j = 0; j <= b.size(); ++j) {
+      if (i == 0 || j == 0) {
+        steps[i][j] = i + j;
+        continue;
+      }
+      steps[i][j] = std::min(
+          {steps[i - 1][j] + 1, steps[i][j - 1] + 1, steps[i - 1][j - 1] + (a[i - 1] != b[j - 1])});
+      const bool isSwapped = i > 1 && j > 1 && a[i - 1] == b[j - 2] && a[i - 2] == b[j - 1];
+      if (isSwapped) steps[i][j] = std::min(steps[i][j], steps[i - 2][j - 2] + 1);
+    }
   }
-  writeMessage("xquery: cannot write standard output: " + output.error() + "\n");
-  return StatusInput;
+  return steps[a.size()][b.size()];
+}
+
+// Of a name as it is given, without its value.
+std::string_view withoutDashes(std::string_view name) {
+  name.remove_prefix(std::min(name.find_first_not_of('-'), name.size()));
+  return name.substr(0, name.find('='));
+}
+
+// The option that may have been meant; empty when none is near.
+std::string nearestOption(const std::string& wrong) {
+  constexpr size_t longest = 32;
+  const std::string_view name = withoutDashes(wrong);
+  std::string nearest;
+  size_t least = name.size() / 3 + 1;
+  if (name.size() > longest) return nearest;
+  for (const OptionRow& row : optionRows()) {
+    const size_t steps = distance(name, withoutDashes(row.name));
+    if (steps > least || withoutDashes(row.name).size() <= steps) continue;
+    if (steps == least && !nearest.empty()) continue;
+    nearest = row.name;
+    least = steps;
+  }
+  return nearest;
+}
+
+// What was not understood is what looks like an option, the last one first.
+std::string unknownOption(const std::vector<std::string>& arguments) {
+  const std::string& wrong = arguments.back();
+  const std::string nearest = nearestOption(wrong);
+  return "unknown option " + wrong + (nearest.empty() ? "" : "; did you mean " + nearest + "?");
 }
 
 Status explain(const std::string& error) {
@@ -130,10 +201,15 @@ std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
   try {
     app.parse(argc, argv);
     applyOptions(app, options);
+    const std::vector<std::string>& shell = app.get_option("--completions")->results();
+    if (!shell.empty()) return printCompletions(shell.front());
     interpretArguments(app, options);
     checkStandardInput(options);
+    checkTogether(options);
   } catch (const CLI::Success& success) {
     return print(app, success);
+  } catch (const CLI::ExtrasError&) {
+    return explain(unknownOption(app.remaining()));
   } catch (const CLI::ParseError& error) {
     return explain(error.what());
   } catch (const WrongUsage& error) {

@@ -3,6 +3,8 @@
 
 #include "xquery/XQuery.h"
 
+#include <chrono>
+#include <cstdint>
 #include <map>
 #include <optional>
 #include <string>
@@ -16,12 +18,24 @@ enum Status : int {
   StatusQueryError = 1,
   StatusUsage = 2,
   StatusInput = 3,  // input that cannot be read or parsed, output that cannot be written
+  StatusFalse = 4,  // with --exit-status, a result that is empty or false
 };
 
 struct Binding {
   std::string name;
   std::string value;
 };
+
+// How results are written.
+enum class Format {
+  Lines,  // nodes as XML, values as text
+  XML,    // one document
+  HTML,
+  JSON,  // one array
+  Text,
+};
+
+enum class Color { Auto, Always, Never };
 
 struct Options {
   std::optional<std::string> queryText;   // -e
@@ -40,6 +54,15 @@ struct Options {
   unsigned repeat = 1;
   unsigned jobs = 0;  // 0: as many as there are processors
   bool withName = false;
+  Format format = Format::Lines;
+  bool indent = false;
+  Color color = Color::Auto;
+  bool exitStatus = false, check = false, quiet = false, progress = false;
+  xquery::XQueryLoadingPolicy policy = xquery::XQueryLoadingPolicy::allowAll();
+  bool hasAllowed = false;                          // and so nothing else is
+  std::optional<std::chrono::nanoseconds> timeout;  // of compiling, and of each evaluation
+  std::optional<uint64_t> memory;                   // in bytes, of the same
+  std::optional<std::string> separator;             // none: a line feed behind each item
 
   // Without any there is no context item.
   bool hasInputs() const { return !inputs.empty() || filesFrom; }

@@ -1,16 +1,18 @@
 #include "OptionsTable.h"
 
-#include "xquery/String.h"
+#include "xquery/xquery.h"
 
 #include <algorithm>
 #include <charconv>
 #include <cstdint>
+#include <filesystem>
+#include <system_error>
+#include <utility>
 
 namespace cli {
 namespace {
 
-using xquery::NSString;
-using xquery::XQueryPlanFormat;
+using namespace xquery;
 
 [[noreturn]] void refuse(const OptionRow& row, const std::string& expected,
                          const std::string& value) {
@@ -92,8 +94,84 @@ void takeDocument(const OptionRow& row, const std::string& text, Options& option
 
 void takeNamespace(const OptionRow& row, const std::string& text, Options& options) {
   needText(row, text);
-  const Binding binding = splitNamed(row, text);
+  const Binding binding = split(row, text);
   options.namespaces[binding.name] = binding.value;
+}
+
+// The marks that a shell makes it hard to write: \n, \t, \0 and, for the mark itself, \\.
+void takeSeparator(const OptionRow& row, const std::string& text, Options& options) {
+  static constexpr std::string_view letters = "nt0\\", meanings("\n\t\0\\", 4);
+  std::string separator;
+  for (size_t i = 0; i < text.size(); ++i) {
+    if (text[i] != '\\') {
+      separator += text[i];
+      continue;
+    }
+    const size_t found = ++i < text.size() ? letters.find(text[i]) : letters.npos;
+    if (found == letters.npos) refuse(row, "\\n, \\t, \\0 or \\\\ where there is a \\", text);
+    separator += meanings[found];
+  }
+  options.separator = separator;
+}
+
+// --- limits --------------------------------------------------------------------------------------
+
+void takeTimeout(const OptionRow& row, const std::string& text, Options& options) {
+  constexpr double most = 1e9;
+  double seconds = 0;
+  const char* const end = text.data() + text.size();
+  const auto read = std::from_chars(text.data(), end, seconds);
+  if (read.ec != std::errc() || read.ptr != end || !(seconds > 0 && seconds <= most)) {
+    refuse(row, "a number of seconds", text);
+  }
+  options.timeout = std::chrono::nanoseconds(static_cast<int64_t>(seconds * 1e9));
+}
+
+void takeMemory(const OptionRow& row, const std::string& text, Options& options) {
+  static constexpr std::string_view units = "KMG";
+  uint64_t bytes = 0;
+  const char* const end = text.data() + text.size();
+  const auto read = std::from_chars(text.data(), end, bytes);
+  unsigned shift = 0;
+  if (read.ec == std::errc() && read.ptr + 1 == end) {
+    const size_t unit = units.find(static_cast<char>(*read.ptr & ~0x20));
+    if (unit != units.npos) shift = 10 * (static_cast<unsigned>(unit) + 1);
+  }
+  const bool isWhole = read.ptr == end || shift > 0;
+  if (read.ec != std::errc() || !isWhole || bytes == 0 || bytes > (UINT64_MAX >> shift)) {
+    refuse(row, "a number of bytes, or one followed by K, M or G", text);
+  }
+  options.memory = bytes << shift;
+}
+
+void denyAll(const OptionRow&, const std::string&, Options& options) {
+  options.policy = XQueryLoadingPolicy::denyAll();
+}
+
+// The library knows schemes and hosts, not pairs of them: two servers with different schemes would
+// allow two more.
+void allowServer(const OptionRow& row, const std::string& text, Options& options) {
+  const Ref<NSURL> URL = NSURL::URLWithString(NSString::stringWithUTF8(text));
+  const std::string scheme = URL ? URL->scheme() : "", host = URL ? URL->host() : "";
+  const bool isServer = text == scheme + "://" + host || text == scheme + "://" + host + "/";
+  if (host.empty() || !isServer || (scheme != "http" && scheme != "https")) {
+    refuse(row, "a folder, or a server as https://example.org/", text);
+  }
+  const std::string other = scheme == "http" ? "https" : "http";
+  if (options.policy.allowsScheme(other)) refuse(row, "a server with " + other, text);
+  options.policy.allowScheme(scheme).allowHost(host);
+}
+
+void allow(const OptionRow& row, const std::string& text, Options& options) {
+  if (!std::exchange(options.hasAllowed, true)) options.policy = XQueryLoadingPolicy::denyAll();
+  std::error_code unknown;
+  if (text.find("://") != text.npos) {
+    allowServer(row, text, options);
+  } else if (std::filesystem::is_directory(text, unknown)) {
+    options.policy.allowFilesBelow(text);
+  } else {
+    throw WrongUsage(std::string(row.name) + ": there is no folder " + text);
+  }
 }
 
 // --- the table -----------------------------------------------------------------------------------
@@ -101,6 +179,7 @@ void takeNamespace(const OptionRow& row, const std::string& text, Options& optio
 constexpr const char* ofQuery = "The query";
 constexpr const char* ofInput = "Its input";
 constexpr const char* ofResult = "The result";
+constexpr const char* ofLimits = "Its limits";
 constexpr const char* ofReports = "Reports";
 
 constexpr OptionRow rows[] = {
@@ -111,9 +190,10 @@ constexpr OptionRow rows[] = {
     {ofQuery, "--doc", Takes::Values, "NAME=FILE", Offers::Files,
      "Bind an external variable to a document", takeDocument},
     {ofQuery, "--namespace", Takes::Values, "P=URI", Offers::Nothing,
-     "Make a namespace prefix known to the query", takeNamespace},
-    {ofInput, "--html", Takes::Nothing, "", Offers::Nothing, "Read INPUT as HTML",
-     set<&Options::html>},
+     "Make a namespace prefix known to the query; without P, that of names without a prefix",
+     takeNamespace},
+    {ofInput, "--html", Takes::Nothing, "", Offers::Nothing,
+     "Read INPUT as HTML, and documents of --doc that are not named .xml", set<&Options::html>},
     {ofInput, "--files-from", Takes::Value, "LIST", Offers::Files,
      "Read more INPUTs from a file, a line each or with a zero behind each",
      take<&Options::filesFrom>},
@@ -123,10 +203,32 @@ constexpr OptionRow rows[] = {
      "Drop text of white space only from documents", set<&Options::stripSpace>},
     {ofResult, "--types", Takes::Nothing, "", Offers::Nothing,
      "Put the type and a tab before each item", set<&Options::types>},
+    {ofResult, "--as", Takes::Value, "lines|xml|html|json|text", Offers::Words,
+     "Write the result as lines of XML and text, as one XML document, as HTML, as an array, or as "
+     "text alone",
+     choose<&Options::format, Format>},
+    {ofResult, "--indent", Takes::Nothing, "", Offers::Nothing,
+     "Write each element on a line of its own where that changes no text", set<&Options::indent>},
+    {ofResult, "--separator", Takes::Value, "S", Offers::Nothing,
+     "Write S between the items, \\n, \\t and \\0 meaning what they do elsewhere, in place of a "
+     "line feed behind each",
+     takeSeparator},
     {ofResult, "--with-name", Takes::Nothing, "", Offers::Nothing,
      "Put the name of the input and a tab before each item", set<&Options::withName>},
+    {ofResult, "--exit-status", Takes::Nothing, "", Offers::Nothing,
+     "End with status 4 when the result is empty or false", set<&Options::exitStatus>},
     {ofResult, "-o", Takes::Value, "FILE", Offers::Files, "Write the result to a file",
      take<&Options::outputFile>},
+    {ofLimits, "--timeout", Takes::Value, "SECONDS", Offers::Nothing,
+     "End an evaluation that takes longer", takeTimeout},
+    {ofLimits, "--memory", Takes::Value, "BYTES", Offers::Nothing,
+     "End an evaluation whose values take more; with K, M or G for larger units", takeMemory},
+    {ofLimits, "--deny-all", Takes::Nothing, "", Offers::Nothing,
+     "Let the query load no files and nothing from the network", denyAll},
+    {ofLimits, "--allow", Takes::Values, "FOLDER-or-URL", Offers::Folders,
+     "Let the query load what is below a folder, or from a server, and nothing else", allow},
+    {ofReports, "--check", Takes::Nothing, "", Offers::Nothing,
+     "Compile the query and report its errors, without evaluating it", set<&Options::check>},
     {ofReports, "--plan", Takes::MaybeValue, "text|json|dot", Offers::Words,
      "Show how the query is evaluated instead of its result",
      choose<&Options::plan, XQueryPlanFormat>},
@@ -134,6 +236,12 @@ constexpr OptionRow rows[] = {
      "Report the time of each phase on standard error", set<&Options::time>},
     {ofReports, "--repeat", Takes::Value, "N", Offers::Nothing,
      "Evaluate N times, print the result once", count<&Options::repeat, 1'000'000'000>},
+    {ofReports, "--color", Takes::Value, "auto|always|never", Offers::Words,
+     "Color messages: on a terminal, always or never", choose<&Options::color, Color>},
+    {ofReports, "--quiet", Takes::Nothing, "", Offers::Nothing,
+     "Show no line about the progress of reading", set<&Options::quiet>},
+    {ofReports, "--progress", Takes::Nothing, "", Offers::Nothing,
+     "Show that line for each of several inputs too", set<&Options::progress>},
 };
 
 }  // namespace

@@ -1,5 +1,7 @@
 #include "ResultFile.h"
 
+#include "Signals.h"
+
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -43,7 +45,9 @@ std::filesystem::path linkTarget(std::filesystem::path place) {
 
 ResultFile::~ResultFile() {
   if (_isOwned && _file >= 0) close(_file);
-  if (!_temporary.empty()) unlink(_temporary.c_str());
+  if (_temporary.empty()) return;
+  unlink(_temporary.c_str());
+  removeAtInterrupt({});
 }
 
 int ResultFile::open(const std::string& path) {
@@ -89,6 +93,7 @@ bool ResultFile::openBeside(const std::string& target, const struct stat* old) {
     return fail(old ? "no new file can be made beside it: " : "");
   }
   _target = target;
+  removeAtInterrupt(_temporary);
   if (old) inheritFrom(*old);
   return true;
 }
@@ -106,6 +111,7 @@ bool ResultFile::finish() {
   if (_isOwned && file >= 0 && close(file) != 0) return fail();
   if (_temporary.empty()) return true;
   if (std::rename(_temporary.c_str(), _target.c_str()) != 0) return fail();
+  removeAtInterrupt({});
   _temporary.clear();
   return true;
 }

@@ -1,6 +1,5 @@
 #include "Results.h"
 
-#include "Messages.h"
 #include "Streams.h"
 
 #include <algorithm>
@@ -80,7 +79,7 @@ void Results::end(size_t number, Part part) {
 }
 
 void Results::endTurn(const Part& part) {
-  if (!part.message.empty()) writeMessage(visible(part.message) + "\n");
+  if (!part.message.empty()) writeMessage(part.message);
   _status = std::max(_status, part.status);
   if (_isOpen && !_output.error().empty()) _isStopped = true;
   ++_next;

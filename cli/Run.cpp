@@ -4,8 +4,9 @@
 #include "Evaluation.h"
 #include "Inputs.h"
 #include "Jobs.h"
-#include "Messages.h"
 #include "Output.h"
+#include "Reports.h"
+#include "Signals.h"
 #include "Streams.h"
 #include "Timing.h"
 #include "xquery/xquery.h"
@@ -20,13 +21,14 @@ void printPlan(const Options& options, const XQuery& query) {
   const std::string plan = query.planDescription(*options.plan)->utf8();
   if (output.open(options.outputFile) && output.append(plan) && output.finish()) return;
   const std::string name = options.outputFile.value_or("standard output");
-  throw Failure{StatusInput, "xquery: cannot write " + name + ": " + output.error()};
+  throw Failure{StatusInput, "xquery: cannot write " + name + ": " + output.error(), {}};
 }
 
 Status runPhases(const Options& options) {
   Phases phases;
   const Ref<NSString> source = queryText(options);
   const Ref<XQuery> query = phases.compile.measure([&] { return compile(options, source); });
+  if (options.check) return StatusResult;
   if (options.plan) {
     printPlan(options, *query);
     return StatusResult;
@@ -35,7 +37,8 @@ Status runPhases(const Options& options) {
   std::optional<std::vector<Input>> inputs;
   if (options.hasInputs()) inputs = inputsOf(options);
   const Status status = runJobs(options, *query, constants, inputs, phases);
-  if (options.time && status == StatusResult) phases.report(options.repeat > 1);
+  if (options.time && (status == StatusResult || status == StatusFalse))
+    phases.report(options.repeat > 1);
   return status;
 }
 
@@ -45,10 +48,11 @@ Status run(const Options& options) {
   try {
     return runPhases(options);
   } catch (const Failure& failure) {
-    writeMessage(visible(failure.message) + "\n");
+    endIfInterrupted();
+    writeMessage(report(options, failure));
     return failure.status;
   } catch (const std::exception& error) {
-    writeMessage("xquery: " + visible(error.what()) + "\n");
+    writeMessage(report(options, {StatusInput, std::string("xquery: ") + error.what(), {}}));
     return StatusInput;
   }
 }

@@ -21,13 +21,17 @@ void prepareStandardStreams() {
 }
 
 void endOfClosedPipe() {
-  std::signal(SIGPIPE, SIG_DFL);
-  sigset_t closedPipe;
-  sigemptyset(&closedPipe);
-  sigaddset(&closedPipe, SIGPIPE);
-  pthread_sigmask(SIG_UNBLOCK, &closedPipe, nullptr);
-  raise(SIGPIPE);
-  _exit(128 + SIGPIPE);
+  endBySignal(SIGPIPE);
+}
+
+void endBySignal(int signal) {
+  std::signal(signal, SIG_DFL);
+  sigset_t one;
+  sigemptyset(&one);
+  sigaddset(&one, signal);
+  pthread_sigmask(SIG_UNBLOCK, &one, nullptr);
+  raise(signal);
+  _exit(128 + signal);
 }
 
 bool writeAll(int file, std::string_view text) {

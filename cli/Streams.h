@@ -18,6 +18,9 @@ void prepareStandardStreams();
 // whose reader had enough; without a message.
 [[noreturn]] void endOfClosedPipe();
 
+// Ends the process as the signal does that nobody handles; also from within its handler.
+[[noreturn]] void endBySignal(int signal);
+
 // Writes to standard error; what cannot be written there cannot be reported anywhere.
 void writeMessage(std::string_view text);
 

@@ -1,6 +1,7 @@
 // The xquery command.
 #include "Options.h"
 #include "Run.h"
+#include "Signals.h"
 #include "Stack.h"
 #include "Streams.h"
 
@@ -10,6 +11,7 @@ int main(int argc, char** argv) {
   cli::Options options;
   if (const auto status = cli::parseOptions(argc, argv, options)) return *status;
   cli::Status status = cli::StatusInput;
+  cli::handleSignals();
   if (!cli::runOnLargeStack([&] { status = cli::run(options); })) {
     cli::writeMessage("xquery: cannot start a thread\n");
   }

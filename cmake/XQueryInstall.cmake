@@ -1,5 +1,5 @@
-# What is installed: the library, its public headers, the command, a CMake package and a pkg-config
-# file.
+# What is installed: the library, its public headers, the command with the completions of shells, the
+# documents and examples, a CMake package and a pkg-config file.
 
 include(CMakePackageConfigHelpers)
 
@@ -10,7 +10,20 @@ if(TARGET xquery-command)
   set_target_properties(xquery-command PROPERTIES
     INSTALL_RPATH "$ORIGIN/../${CMAKE_INSTALL_LIBDIR}")
   install(TARGETS xquery-command RUNTIME DESTINATION "${CMAKE_INSTALL_BINDIR}")
+  set(completions "${PROJECT_BINARY_DIR}/completions")
+  install(FILES "${completions}/xquery"
+          DESTINATION "${CMAKE_INSTALL_DATADIR}/bash-completion/completions")
+  install(FILES "${completions}/_xquery"
+          DESTINATION "${CMAKE_INSTALL_DATADIR}/zsh/site-functions")
+  install(FILES "${completions}/xquery.fish"
+          DESTINATION "${CMAKE_INSTALL_DATADIR}/fish/vendor_completions.d")
 endif()
+
+install(FILES "${PROJECT_SOURCE_DIR}/LICENSE" DESTINATION "${CMAKE_INSTALL_DOCDIR}")
+install(DIRECTORY "${PROJECT_SOURCE_DIR}/docs/" DESTINATION "${CMAKE_INSTALL_DOCDIR}"
+        FILES_MATCHING PATTERN "*.md")
+install(DIRECTORY "${PROJECT_SOURCE_DIR}/examples" DESTINATION "${CMAKE_INSTALL_DOCDIR}"
+        PATTERN CMakeLists.txt EXCLUDE)
 
 set(package_dir "${CMAKE_INSTALL_LIBDIR}/cmake/xquery")
 install(EXPORT xqueryTargets NAMESPACE xquery:: DESTINATION "${package_dir}")

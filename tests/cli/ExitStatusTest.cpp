@@ -109,7 +109,7 @@ INSTANTIATE_TEST_SUITE_P(
         WrongUsage{"DocumentNameNotUTF8", {"--doc", "\xff=x", "-e", "1"}, "--doc: not UTF-8"},
         WrongUsage{
             "NamespaceNotUTF8", {"--namespace", "p=\xff", "-e", "1"}, "--namespace: not UTF-8"},
-        WrongUsage{"NamespaceWithoutPrefix", {"--namespace", "=urn:x", "-e", "1"}, "--namespace"},
+        WrongUsage{"SeparatorOfNothing", {"--separator", "\\x", "-e", "1"}, "--separator"},
         WrongUsage{"OptionsWithoutValues", {"-e", "1", "-o"}, "-o"},
         WrongUsage{"VariableWithoutAnything", {"-e", "1", "--var"}, "--var"},
         WrongUsage{"FlagWithValue", {"-e", "1", "--types=x"}, "--types"},

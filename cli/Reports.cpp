@@ -1,0 +1,77 @@
+#include "Reports.h"
+
+#include "JSON.h"
+#include "Messages.h"
+
+#include <cstdlib>
+#include <string_view>
+#include <unistd.h>
+
+namespace cli {
+namespace {
+
+using namespace xquery;
+
+// NO_COLOR is what people set who want none anywhere.
+bool usesColor(const Options& options) {
+  if (options.color != Color::Auto) return options.color == Color::Always;
+  const char* const none = std::getenv("NO_COLOR");
+  const char* const terminal = std::getenv("TERM");
+  if (none && *none) return false;
+  return isatty(STDERR_FILENO) && terminal && std::string_view(terminal) != "dumb";
+}
+
+// The beginning of each line that says what kind of failure it is.
+std::string colored(const std::string& text) {
+  static constexpr std::string_view heads[] = {"XQueryError:", "xquery:"};
+  std::string result;
+  for (std::string_view rest = text; !rest.empty();) {
+    const size_t end = std::min(rest.find('\n'), rest.size() - 1) + 1;
+    std::string_view line = rest.substr(0, end);
+    for (const std::string_view head : heads) {
+      const size_t at = line.find(head);
+      if (at == line.npos) continue;
+      const size_t stop = std::min(line.find(' ', at), line.size() - 1);
+      result += line.substr(0, at);
+      result += "\033[1;31m" + std::string(line.substr(at, stop - at)) + "\033[0m";
+      line.remove_prefix(stop);
+      break;
+    }
+    result += line;
+    rest.remove_prefix(end);
+  }
+  return result;
+}
+
+std::string jsonOfError(const NSError& error) {
+  const auto* own = dyn_cast<XQueryError>(&error);
+  const Ref<NSString> text = own ? own->msg() : error.localizedDescription();
+  std::string json = "\"code\":" + std::to_string(error.code());
+  if (text) json += ",\"message\":" + jsonString(text->utf8());
+  if (own && own->line() > 0) json += ",\"line\":" + std::to_string(own->line());
+  if (own && own->column() > 0) json += ",\"column\":" + std::to_string(own->column());
+  if (own && own->moduleURL()) json += ",\"module\":" + jsonString(own->moduleURL()->utf8());
+  return json;
+}
+
+std::string asJSON(const Failure& failure, const std::string& input) {
+  const std::string rest = (input.empty() ? "" : ",\"input\":" + jsonString(input)) +
+                           ",\"status\":" + std::to_string(failure.status) + "}\n";
+  if (failure.errors.empty()) {
+    return "{\"message\":" + jsonString(failure.message) + rest;
+  }
+  std::string lines;
+  for (const Ref<NSError>& error : failure.errors) lines += "{" + jsonOfError(*error) + rest;
+  return lines;
+}
+
+}  // namespace
+
+std::string report(const Options& options, const Failure& failure, const std::string& input) {
+  if (options.format == Format::JSON) return asJSON(failure, input);
+  const bool isNamed = !input.empty() && failure.status == StatusQueryError;
+  const std::string text = visible((isNamed ? input + ": " : "") + failure.message) + "\n";
+  return usesColor(options) ? colored(text) : text;
+}
+
+}  // namespace cli
