@@ -6,17 +6,13 @@
 
 #include <algorithm>
 #include <iterator>
+#include <utility>
 
 namespace xquery {
 
 namespace {
 
 constexpr size_t smallestTable = 16;
-
-// Navigation answers nodes that the caller may change, whoever asks.
-NSXMLNode* changeable(const NSXMLNode* node) {
-  return const_cast<NSXMLNode*>(node);
-}
 
 }  // namespace
 
@@ -42,7 +38,7 @@ class NSXMLNameIndex::Maker {
     Name& name = _table[place];
     ++name.end;
     _numbers.push_back(name.begin);
-    _arrived.push_back(changeable(node));
+    _arrived.push_back(node);
   }
   void addInstruction() { _hasInstructions = true; }
   std::unique_ptr<const NSXMLNameIndex> index();
@@ -67,7 +63,7 @@ class NSXMLNameIndex::Maker {
   NSXMLIndexList<Name> _table;
   uint32_t _nameCount = 0;
   bool _hasInstructions = false;
-  NSXMLIndexList<NSXMLNode*> _arrived;
+  NSXMLNodeList _arrived;
   NSXMLIndexList<uint32_t> _numbers;  // of the names of those nodes
 };
 
@@ -91,11 +87,10 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::Maker::index() {
     each.end += each.begin;
   }
   std::unique_ptr<NSXMLNameIndex> made(new NSXMLNameIndex);
-  made->_nodes.resize(_arrived.size());
-  for (size_t i = 0; i < _arrived.size(); ++i) {
+  made->_nodes.arrange(_arrived, [&](size_t i) {
     pacer.turn();
-    made->_nodes[next[_numbers[i]]++] = _arrived[i];
-  }
+    return next[_numbers[i]]++;
+  });
   made->_table = std::move(_table);
   made->_hasInstructions = _hasInstructions;
   return made;
@@ -135,33 +130,33 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofAttributes(const NSXMLNo
 
 NSXMLNodeSpan NSXMLNameIndex::nodes(const NSXMLExpandedName* name) const {
   const Name& found = _table[placeOf(_table, name)];
-  return NSXMLNodeSpan(_nodes).subspan(found.begin, found.end - found.begin);
+  return _nodes.span().subspan(found.begin, found.end - found.begin);
 }
 
-NSXMLIndexList<NSXMLNode*> NSXMLNameIndex::nodes(const NSXMLNameSelection& selection,
-                                                 const NSXMLNode* first,
-                                                 const NSXMLNode* stop) const {
+NSXMLNodeList NSXMLNameIndex::nodes(const NSXMLNameSelection& selection, const NSXMLNode* first,
+                                    const NSXMLNode* stop) const {
   WorkPacer pacer;
   const auto isBefore = [&pacer](const NSXMLNode* a, const NSXMLNode* b) {
     pacer.turn();
     return a->orderNumber() < b->orderNumber();
   };
-  NSXMLIndexList<NSXMLNode*> found;
-  NSXMLIndexList<NSXMLNode*> merged;
+  NSXMLNodeList found;
+  NSXMLNodeList merged;
   for (const Name& name : _table) {
     pacer.turn();
     if (!name.name || !selection.mayTake(*name.name)) continue;
-    const NSXMLNodeSpan all = NSXMLNodeSpan(_nodes).subspan(name.begin, name.end - name.begin);
+    const NSXMLNodeSpan all = _nodes.span().subspan(name.begin, name.end - name.begin);
     const NSXMLNodeSpan more = between(all, first, stop);
     merged.clear();
     merged.reserve(found.size() + more.size());
-    std::merge(found.begin(), found.end(), more.begin(), more.end(), std::back_inserter(merged),
+    const NSXMLNodeSpan before = found.span();
+    std::merge(before.begin(), before.end(), more.begin(), more.end(), std::back_inserter(merged),
                isBefore);
-    found.swap(merged);
+    std::swap(found, merged);
   }
-  std::erase_if(found, [&](const NSXMLNode* node) {
+  found.keepThose([&](const NSXMLNode& node) {
     pacer.turn();
-    return !selection.takes(*node);
+    return selection.takes(node);
   });
   return found;
 }

@@ -11,21 +11,14 @@
 // that the tree does not have is known to be missing without an entry of its own.
 #pragma once
 
+#include "Platform/Tree/NodeSpan.h"
 #include "xquery/XMLNode.h"
 
 #include <cstddef>
 #include <cstdint>
 #include <memory>
-#include <span>
-#include <vector>
 
 namespace xquery {
-
-using NSXMLNodeSpan = std::span<NSXMLNode* const>;
-
-// A list that counts towards the memory ceiling.
-template <class T>
-using NSXMLIndexList = std::vector<T, ValueAllocator<T>>;
 
 // Which names somebody looks for.
 class NSXMLNameSelection {
@@ -53,8 +46,8 @@ class NSXMLNameIndex {
   // All nodes of this name.
   NSXMLNodeSpan nodes(const NSXMLExpandedName* name) const;
   // The nodes of several names, from `first` on before `stop` as below, in document order.
-  NSXMLIndexList<NSXMLNode*> nodes(const NSXMLNameSelection& selection, const NSXMLNode* first,
-                                   const NSXMLNode* stop) const;
+  NSXMLNodeList nodes(const NSXMLNameSelection& selection, const NSXMLNode* first,
+                      const NSXMLNode* stop) const;
   // Whether the tree of an index of elements has processing instructions, which have names too.
   bool hasInstructions() const { return _hasInstructions; }
   // Of nodes in document order those from `first` on that come before `stop`, which is null for the
@@ -71,14 +64,14 @@ class NSXMLNameIndex {
     uint32_t end = 0;
   };
   // The list of nodes and that of their names, and the result.
-  static constexpr size_t bytesPerNode = 2 * sizeof(NSXMLNode*) + sizeof(uint32_t);
+  static constexpr size_t bytesPerNode = 2 * sizeof(NSXMLNodePlace) + sizeof(uint32_t);
 
   NSXMLNameIndex() = default;
   // The name's own place, or the empty one where it belongs.
   static size_t placeOf(const NSXMLIndexList<Name>& table, const NSXMLExpandedName* name);
 
   NSXMLIndexList<Name> _table;  // 2^n places, at most half of them taken
-  NSXMLIndexList<NSXMLNode*> _nodes;
+  NSXMLNodeList _nodes;
   bool _hasInstructions = false;
 };
 

@@ -144,13 +144,13 @@ const NSXMLValueIndex* NSXMLTreeIndexes::makeOfOwners(KeyPlace& place,
   if (!all) return nullptr;
   const NSXMLNodeSpan found = all->nodes(place.key.attribute.get());
   return makeOnce(place, NSXMLValueIndex::likelyBytes(found.size()), [&] {
-    NSXMLIndexList<NSXMLNode*> owners;
+    NSXMLNodeList owners;
     WorkPacer pacer;
     for (const NSXMLNode* attribute : found) {
       pacer.turn();
       owners.push_back(attribute->parent());
     }
-    return NSXMLValueIndex::make(owners, place.key, names);
+    return NSXMLValueIndex::make(owners.span(), place.key, names);
   });
 }
 
@@ -218,7 +218,7 @@ std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLNameSelection& 
   const NSXMLNameIndex* const elements = walk.indexes ? walk.indexes->elements(walk.work) : nullptr;
   if (!elements || (withInstructions && elements->hasInstructions())) return std::nullopt;
   NSXMLIndexedNodes found{std::move(walk.indexes), {}, elements->nodes(names, first, stop)};
-  found.nodes = found.merged;
+  found.nodes = found.merged.span();
   return found;
 }
 

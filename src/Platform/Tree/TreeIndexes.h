@@ -126,7 +126,7 @@ class NSXMLTreeIndexes {
 struct NSXMLIndexedNodes {
   NSXMLIndexesRef indexes;
   NSXMLNodeSpan nodes;
-  NSXMLIndexList<NSXMLNode*> merged{};  // of several names
+  NSXMLNodeList merged{};  // of several names
 };
 
 // The elements of the name that a walk in document order meets from `first` on before `stop`, which

@@ -95,7 +95,7 @@ bool operator==(const NSXMLValueKey& a, const NSXMLValueKey& b) {
 size_t NSXMLValueIndex::placeOf(NSStringView value, uint32_t hash) const {
   const size_t mask = _table.size() - 1;
   const auto isValue = [&](const KnownValue& known) {
-    return known.hash == hash && StringValue(known.first).view() == value;
+    return known.hash == hash && StringValue(known.first.node(_start)).view() == value;
   };
   WorkPacer pacer;
   size_t place = hash & mask;
@@ -124,11 +124,12 @@ class NSXMLValueIndex::Maker {
  public:
   Maker() { _index->growTable(); }
 
-  void add(NSXMLNode* element, const NSXMLNode* valueNode) {
+  void add(const NSXMLNode* element, const NSXMLNode* valueNode) {
     const StringValue value(valueNode);
     const uint32_t number = numberOf(value.view(), valueNode);
-    if (_lastElements[number] == element) return;
-    _lastElements[number] = element;
+    const NSXMLNodePlace place(element);
+    if (_lastElements[number] == place) return;
+    _lastElements[number] = place;
     ++_index->_values[number].end;
     _numbers.push_back(number);
     _arrived.push_back(element);
@@ -142,15 +143,16 @@ class NSXMLValueIndex::Maker {
     if (_index->_table[place] != free) return _index->_table[place];
     const auto number = static_cast<uint32_t>(_index->_values.size());
     _index->_table[place] = number;
-    _index->_values.push_back({node, hash, 0});
-    _lastElements.push_back(nullptr);
+    _index->_start = NSXMLNodePlace::start(node);
+    _index->_values.push_back({NSXMLNodePlace(node), hash, 0});
+    _lastElements.push_back({});
     if (2 * _index->_values.size() > _index->_table.size()) _index->growTable();
     return number;
   }
 
   std::unique_ptr<NSXMLValueIndex> _index{new NSXMLValueIndex};
-  NSXMLIndexList<const NSXMLNode*> _lastElements;  // by number of the value
-  NSXMLIndexList<NSXMLNode*> _arrived;
+  NSXMLIndexList<NSXMLNodePlace> _lastElements;  // by number of the value
+  NSXMLNodeList _arrived;
   NSXMLIndexList<uint32_t> _numbers;  // of the values of those elements
 };
 
@@ -165,11 +167,10 @@ std::unique_ptr<const NSXMLValueIndex> NSXMLValueIndex::Maker::index() {
     sum += each.end;
     each.end = sum;
   }
-  _index->_nodes.resize(_arrived.size());
-  for (size_t i = 0; i < _arrived.size(); ++i) {
+  _index->_nodes.arrange(_arrived, [&](size_t i) {
     pacer.turn();
-    _index->_nodes[next[_numbers[i]]++] = _arrived[i];
-  }
+    return next[_numbers[i]]++;
+  });
   return std::move(_index);
 }
 
@@ -184,12 +185,12 @@ std::unique_ptr<const NSXMLValueIndex> NSXMLValueIndex::make(NSXMLNodeSpan eleme
                                     [](const auto& step) { return step.isToDescendants; });
   Maker maker;
   WorkPacer pacer;
-  NSXMLNode* element = nullptr;
+  const NSXMLNode* element = nullptr;
   ValueWalk walk(key, names, [&](const NSXMLNode* value) {
     maker.add(element, value);
     return !goesDown || --valuesLeft > 0;
   });
-  for (NSXMLNode* each : elements) {
+  for (const NSXMLNode* each : elements) {
     pacer.turn();
     element = each;
     if (walk.walk(each)) continue;
@@ -205,7 +206,7 @@ NSXMLNodeSpan NSXMLValueIndex::nodes(NSStringView value) const {
   const uint32_t number = _table[placeOf(value, value.hash())];
   if (number == free) return {};
   const uint32_t begin = number == 0 ? 0 : _values[number - 1].end;
-  return NSXMLNodeSpan(_nodes).subspan(begin, _values[number].end - begin);
+  return _nodes.span().subspan(begin, _values[number].end - begin);
 }
 
 }  // namespace xquery

@@ -63,15 +63,15 @@ class NSXMLValueIndex {
  private:
   class Maker;
   struct KnownValue {
-    const NSXMLNode* first;  // with this value
+    NSXMLNodePlace first;  // with this value
     uint32_t hash;
     uint32_t end;  // of its elements, which begin where those of the value before it end
   };
   static constexpr uint32_t free = UINT32_MAX;
   // The lists of values, of the elements and of what is noted of both while they grow; the table.
   static constexpr size_t bytesPerElement =
-      3 * (sizeof(KnownValue) + 2 * sizeof(NSXMLNode*) + sizeof(uint32_t)) + sizeof(NSXMLNode*) +
-      6 * sizeof(uint32_t);
+      3 * (sizeof(KnownValue) + 2 * sizeof(NSXMLNodePlace) + sizeof(uint32_t)) +
+      sizeof(NSXMLNodePlace) + 6 * sizeof(uint32_t);
 
   NSXMLValueIndex() = default;
   // The place of the value, or the free one where it belongs.
@@ -80,7 +80,8 @@ class NSXMLValueIndex {
 
   NSXMLIndexList<uint32_t> _table;  // numbers of values; 2^n places, at most half of them taken
   NSXMLIndexList<KnownValue> _values;
-  NSXMLIndexList<NSXMLNode*> _nodes;
+  NSXMLNodeList _nodes;
+  uintptr_t _start = 0;  // of the range that the places are in
   bool _isGivenUp = false;
 };
 

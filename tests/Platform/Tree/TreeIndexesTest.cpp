@@ -520,7 +520,7 @@ TEST(XMLTreeIndexes, CountTowardsTheCeilingUntilTheyGo) {
     const size_t elements = walked(Kind::Element, name("a").get(), document.get(), nullptr).size();
     static_cast<void>(filled(document.get()));
     EXPECT_GT(workMeter.valueBytes - ofTree,
-              static_cast<int64_t>(elements * 4 * sizeof(NSXMLNode*)));
+              static_cast<int64_t>(elements * 4 * sizeof(NSXMLNodePlace)));
     {
       const Ref<NSXMLNode> text = NSXMLNode::textWithStringValue(A("x"));
       document->rootElement()->addChild(text);
@@ -530,6 +530,15 @@ TEST(XMLTreeIndexes, CountTowardsTheCeilingUntilTheyGo) {
     static_cast<void>(filled(document.get()));
   }
   EXPECT_EQ(workMeter.valueBytes, atFirst);
+}
+
+TEST(XMLNameIndex, TakesFourBytesForEachElement) {
+  const auto document = parsed(Records(12).text(4000));
+  const int64_t before = workMeter.valueBytes;
+  const auto index = NSXMLNameIndex::ofElements(document.get());
+  constexpr int64_t ofNames = 1024;
+  EXPECT_LE(workMeter.valueBytes - before, 4001 * 4 + ofNames);
+  EXPECT_EQ(listed(index->nodes(name("r").get())).size(), 1U);
 }
 
 // --- threads -------------------------------------------------------------------------------------
