@@ -81,7 +81,7 @@ constexpr size_t bytesOfBlock = 64;
 constexpr size_t bytesOfStep = 16;
 // Where the last step of a block may begin: the end of a character shows at the byte behind it.
 constexpr size_t stepsEnd = bytesOfBlock - WideningTables::bytesLookedAt;
-// How far a fault reaches back.
+// How far a fault reaches back. Where a character begins, zeros do as well as what is there.
 constexpr size_t bytesBefore = 3;
 
 HWY_INLINE Vector entries(const uint8_t (&table)[16], Vector places) {
@@ -220,10 +220,9 @@ HWY_INLINE size_t widenBlock(const WideningTables& tables, const uint8_t* bytes,
   return at;
 }
 
-// Of fewer bytes than two such parts. Compilers make any loop an instruction that takes long to
-// begin.
+// Fewer bytes than two such parts.
 template <size_t Part>
-HWY_INLINE void copyFew(char* to, const char* from, size_t count) {
+HWY_INLINE void copyFew(uint8_t* to, const uint8_t* from, size_t count) {
   if (count & Part) {
     std::memcpy(to, from, Part);
     to += Part;
@@ -232,44 +231,101 @@ HWY_INLINE void copyFew(char* to, const char* from, size_t count) {
   if constexpr (Part > 1) copyFew<Part / 2>(to, from, count);
 }
 
-// A part of a text that has nothing before it or behind it that may be read, and no room for units
-// that are not wanted: in a place of its own, between zeros.
-HWY_INLINE Widened widenApart(const WideningTables& tables, std::string_view bytes,
-                              char16_t* units) {
-  constexpr size_t most = bytesOfBlock + bytesOfStep;
-  uint8_t copy[bytesOfStep + most] = {};
-  uint8_t* const block = copy + bytesOfStep;
-  char16_t room[most];
-  copyFew<64>(reinterpret_cast<char*>(block), bytes.data(), std::min(bytes.size(), most));
-  uint64_t ends = 0;
-  if (!readBlock(block, ends)) return {0, 0};
-  char16_t* to = room;
-  size_t done = widenBlock(tables, block, ends, std::min(bytes.size(), stepsEnd), to);
-  if (done > bytes.size()) {
-    to -= done - bytes.size();
-    done = bytes.size();
+// At most so many bytes, in pieces that overlap: how many there are is nothing that a processor
+// could foresee.
+template <size_t Most>
+HWY_INLINE void copySome(uint8_t* to, const uint8_t* from, size_t count) {
+  constexpr size_t piece = 16;
+  if (count < piece) return copyFew<piece / 2>(to, from, count);
+  for (size_t at = 0; at < Most; at += piece) {
+    const size_t place = std::min(at, count - piece);
+    std::memcpy(to + place, from + place, piece);
   }
-  const auto count = static_cast<size_t>(to - room);
-  copyFew<128>(reinterpret_cast<char*>(units), reinterpret_cast<const char*>(room),
-               count * sizeof(char16_t));
-  return {done, count};
+}
+
+// A block is read where it is, and its units are put where they belong, if so much may be read from
+// its beginning on and so many units be written.
+constexpr size_t bytesInReach = bytesOfBlock + bytesOfStep;
+constexpr size_t unitsInReach = stepsEnd + bytesOfStep;
+
+// What a text begins with, which has nothing before it that may be read.
+HWY_INLINE bool readFirstBlock(const uint8_t* bytes, uint64_t& ends) {
+  uint8_t copy[bytesOfStep + bytesOfBlock] = {};
+  std::memcpy(copy + bytesOfStep, bytes, bytesOfBlock);
+  return readBlock(copy + bytesOfStep, ends);
+}
+
+// So many bytes in a place of their own, with zeros behind them.
+HWY_INLINE Widened widenCopy(const WideningTables& tables, const uint8_t* bytes, size_t count,
+                             char16_t* units) {
+  uint64_t ends = 0;
+  if (!readBlock(bytes, ends)) return {0, 0};
+  char16_t* to = units;
+  size_t done = widenBlock(tables, bytes, ends, std::min(count, stepsEnd), to);
+  if (done > count) {
+    to -= done - count;
+    done = count;
+  }
+  return {done, static_cast<size_t>(to - units)};
+}
+
+// The same where there may be room for no more units than bytes.
+HWY_INLINE Widened widenCopyApart(const WideningTables& tables, const uint8_t* bytes, size_t count,
+                                  char16_t* units) {
+  char16_t made[unitsInReach];
+  const Widened part = widenCopy(tables, bytes, count, made);
+  copySome<sizeof made>(reinterpret_cast<uint8_t*>(units), reinterpret_cast<const uint8_t*>(made),
+                        part.units * sizeof(char16_t));
+  return part;
+}
+
+// Of a text that has nothing around it that may be read, and is too short for a block that could be
+// read where it is.
+HWY_INLINE Widened widenShort(const WideningTables& tables, std::string_view bytes,
+                              char16_t* units) {
+  uint8_t copy[bytesOfStep + 2 * bytesInReach] = {};
+  copySome<bytesInReach>(copy + bytesOfStep, reinterpret_cast<const uint8_t*>(bytes.data()),
+                         bytes.size());
+  Widened all{0, 0};
+  while (all.bytes < bytes.size()) {
+    const Widened part = widenCopyApart(tables, copy + bytesOfStep + all.bytes,
+                                        bytes.size() - all.bytes, units + all.units);
+    if (!part.bytes) break;
+    all.bytes += part.bytes;
+    all.units += part.units;
+  }
+  return all;
+}
+
+// The last bytes of a text that has more than are in reach.
+HWY_INLINE Widened widenEnd(const WideningTables& tables, const uint8_t* end, size_t count,
+                            size_t room, char16_t* units) {
+  uint8_t copy[bytesOfStep + 2 * bytesInReach] = {};
+  std::memcpy(copy + bytesOfStep, end - bytesInReach, bytesInReach);
+  const uint8_t* const bytes = copy + bytesOfStep + bytesInReach - count;
+  return room < unitsInReach ? widenCopyApart(tables, bytes, count, units)
+                             : widenCopy(tables, bytes, count, units);
 }
 
 HWY_ATTR Widened widenByVectors(std::string_view bytes, char16_t* units) {
   static const WideningTables tables;
+  if (bytes.size() < bytesInReach) return widenShort(tables, bytes, units);
+  const auto* const begin = reinterpret_cast<const uint8_t*>(bytes.data());
   size_t done = 0;
   char16_t* to = units;
-  uint64_t ends = 0;
   while (done < std::min(bytes.size(), widenedAtOnce)) {
-    if (done < bytesBefore || bytes.size() - done < bytesOfBlock + bytesOfStep) {
-      const Widened part = widenApart(tables, bytes.substr(done), to);
+    const size_t left = bytes.size() - done;
+    if (left < bytesInReach) {
+      const auto made = static_cast<size_t>(to - units);
+      const Widened part = widenEnd(tables, begin + bytes.size(), left, bytes.size() - made, to);
       if (!part.bytes) break;
       done += part.bytes;
       to += part.units;
       continue;
     }
-    const auto* const block = reinterpret_cast<const uint8_t*>(bytes.data() + done);
-    if (!readBlock(block, ends)) break;
+    uint64_t ends = 0;
+    const uint8_t* const block = begin + done;
+    if (!(done ? readBlock(block, ends) : readFirstBlock(block, ends))) break;
     done += widenBlock(tables, block, ends, stepsEnd, to);
   }
   return {done, static_cast<size_t>(to - units)};
