@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <initializer_list>
 #include <sys/ioctl.h>
 #include <unistd.h>
 #include <utility>
@@ -50,35 +51,68 @@ size_t columnsOfTerminal() {
   return ioctl(STDERR_FILENO, TIOCGWINSZ, &window) == 0 && window.ws_col ? window.ws_col : usual;
 }
 
+// The end of a path tells most.
+std::string shortened(const std::string& name, size_t room) {
+  const std::string cut = "...";
+  if (name.size() <= room) return name;
+  size_t first = room > cut.size() ? name.size() - (room - cut.size()) : name.size();
+  while (first < name.size() && (static_cast<unsigned char>(name[first]) & 0xC0) == 0x80) ++first;
+  return cut + name.substr(first);
+}
+
+// What can be said, with the most telling last to go where there is little room.
+struct Figures {
+  std::string amount;
+  std::string share;  // this and the time left are empty where the size is not known
+  std::string rate;
+  std::string left;
+};
+
+Figures figuresOf(double done, double all, bool isKnown, double seconds) {
+  const double rate = done / std::max(seconds, 1e-9);
+  const Unit unit = unitFor(isKnown ? all : done);
+  Figures figures;
+  figures.amount = size(done, unit);
+  if (isKnown) figures.amount += " of " + size(all, unit);
+  figures.amount += std::string(" ") + unit.name;
+  if (isKnown) figures.share = number(100 * done / all, 0) + " %";
+  figures.rate = size(rate, unitFor(rate)) + " " + unitFor(rate).name + "/s";
+  if (isKnown && rate > 0) figures.left = duration((all - done) / rate) + " left";
+  return figures;
+}
+
+std::string joined(std::initializer_list<std::string> parts) {
+  std::string all;
+  for (const std::string& part : parts) {
+    if (!all.empty() && !part.empty()) all += ", ";
+    all += part;
+  }
+  return all;
+}
+
 }  // namespace
 
 std::string progressText(const std::string& name, uint64_t bytes, uint64_t whole,
                          std::chrono::duration<double> elapsed, size_t columns) {
-  const auto done = static_cast<double>(bytes), all = static_cast<double>(whole);
-  const double rate = done / std::max(elapsed.count(), 1e-9);
-  const bool isKnown = bytes <= whole;
-  const Unit unit = unitFor(isKnown ? all : done);
-  std::string figures = size(done, unit);
-  if (isKnown) figures += " of " + size(all, unit);
-  figures += std::string(" ") + unit.name;
-  if (isKnown && whole > 0) figures += ", " + number(100 * done / all, 0) + " %";
-  figures += ", " + size(rate, unitFor(rate)) + " " + unitFor(rate).name + "/s";
-  if (isKnown && rate > 0) figures += ", " + duration((all - done) / rate) + " left";
-
+  const Figures figures = figuresOf(static_cast<double>(bytes), static_cast<double>(whole),
+                                    whole > 0 && bytes <= whole, elapsed.count());
+  const std::string all = joined({figures.amount, figures.share, figures.rate, figures.left});
   const std::string head = "xquery: reading ", between = ": ";
-  const size_t taken = head.size() + between.size() + figures.size();
-  // The end of a path tells most.
-  const std::string cut = "...";
-  std::string shown = name;
-  const size_t room = columns > taken ? columns - taken : 0;
-  if (shown.size() > room) {
-    size_t first = room > cut.size() ? shown.size() - (room - cut.size()) : shown.size();
-    while (first < shown.size() && (static_cast<unsigned char>(shown[first]) & 0xC0) == 0x80) {
-      ++first;
-    }
-    shown = cut + shown.substr(first);
+  const size_t taken = head.size() + between.size() + all.size();
+  constexpr size_t shortestName = 8;
+  if (columns >= taken + std::min(shortestName, name.size())) {
+    return head + shortened(name, columns - taken) + between + all;
   }
-  return head + shown + between + figures;
+  const std::string shorter[] = {
+      all,
+      joined({figures.share, figures.rate, figures.left}),
+      joined({figures.share, figures.left}),
+      figures.share.empty() ? figures.amount : figures.share,
+  };
+  for (const std::string& text : shorter) {
+    if (!text.empty() && text.size() <= columns) return text;
+  }
+  return {};
 }
 
 ProgressLine::ProgressLine(std::string name)

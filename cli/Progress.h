@@ -9,7 +9,8 @@ namespace cli {
 
 // What the line says: "xquery: reading big.xml: 1.2 of 3.4 GB, 35 %, 230 MB/s, 10 s left". Without
 // share and time left where `whole` is 0, which is for not known. The name is shortened so that the
-// line fits so many columns.
+// line fits so many columns; where even that is too long, the name goes, and then all but what
+// tells most: "35 %, 10 s left". Nothing where there is no room for that.
 std::string progressText(const std::string& name, uint64_t bytes, uint64_t whole,
                          std::chrono::duration<double> elapsed, size_t columns);
 

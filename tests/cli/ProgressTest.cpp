@@ -43,8 +43,30 @@ TEST(Progress, ShortensTheNameToTheTerminal) {
   for (size_t columns = 0; columns < 100; ++columns) {
     const std::string shown =
         progressText("äöü/äöü/äöü.xml", 1500000, 0, duration<double>(3), columns);
-    EXPECT_TRUE(shown.size() <= columns || columns < 50) << columns;
+    EXPECT_LE(shown.size(), columns);
     EXPECT_THAT(shown, Not(HasSubstr("...\xA4")));
+  }
+}
+
+TEST(Progress, SaysWhatTellsMostWhereThereIsLittleRoom) {
+  const auto shown = [](uint64_t whole, size_t columns) {
+    return progressText("records.xml", 1200000000, whole, std::chrono::duration<double>(5),
+                        columns);
+  };
+  constexpr uint64_t known = 3400000000;
+  EXPECT_EQ(shown(known, 67),
+            "xquery: reading ...s.xml: 1.2 of 3.4 GB, 35 %, 240.0 MB/s, 9 s left");
+  EXPECT_EQ(shown(known, 60), "1.2 of 3.4 GB, 35 %, 240.0 MB/s, 9 s left");
+  EXPECT_EQ(shown(known, 40), "35 %, 240.0 MB/s, 9 s left");
+  EXPECT_EQ(shown(known, 19), "35 %, 9 s left");
+  EXPECT_EQ(shown(known, 13), "35 %");
+  EXPECT_EQ(shown(known, 3), "");
+  EXPECT_EQ(shown(0, 19), "1.2 GB, 240.0 MB/s");
+  EXPECT_EQ(shown(0, 17), "240.0 MB/s");
+  EXPECT_EQ(shown(0, 9), "1.2 GB");
+  for (size_t columns = 0; columns < 100; ++columns) {
+    EXPECT_LE(shown(known, columns).size(), columns);
+    EXPECT_LE(shown(0, columns).size(), columns);
   }
 }
 
@@ -59,6 +81,25 @@ TEST(Progress, AppearsAfterASecondAndGoes) {
   EXPECT_EQ(command::readFile(directory.path("out")), "1\n");
   EXPECT_THAT(outcome.out, AllOf(HasSubstr("/f: 7 B, "), HasSubstr(" B/s")));
   EXPECT_THAT(outcome.out, HasSubstr(" \r"));
+}
+
+// The message of an error stands on a line of its own.
+TEST(Progress, FitsANarrowTerminalAndIsGoneBeforeAnError) {
+  const TemporaryDirectory directory;
+  const Outcome outcome = shell(
+      "mkfifo $1/f; { printf '<a>'; sleep 1.2; printf '</b>'; } > $1/f & "
+      "script -qec \"stty cols 20; $0 -e '1' $1/f\" $1/terminal </dev/null >/dev/null; "
+      "tr '\\r' '\\n' < $1/terminal | grep -v '^Script'",
+      {directory.path("."), ""});
+  const size_t shown = outcome.out.find("\n7 B, ");
+  ASSERT_NE(shown, std::string::npos) << outcome.out;
+  const size_t end = outcome.out.find('\n', shown + 1);
+  EXPECT_LT(end - shown, 20U);
+  const std::string cleared = outcome.out.substr(end + 1);
+  const size_t blanks = cleared.find_first_not_of(' ');
+  EXPECT_EQ(blanks, end - shown - 1);
+  EXPECT_EQ(cleared[blanks], '\n');
+  EXPECT_THAT(cleared.substr(blanks), HasSubstr("/f:1:"));
 }
 
 TEST(Progress, StaysOutOfFiles) {
