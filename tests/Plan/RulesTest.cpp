@@ -287,8 +287,9 @@ TEST(CountPaths, TakesOverWhereOnlyTheNumberMatters) {
 
 TEST(CountPaths, LeavesOthersAlone) {
   for (const char* text :
-       {"count((//a, 1))", "count(//a/string(.))", "exists($g)", "exists(//a/(1, 2))",
-        "count(//a[<x/>])", "exists(//p:a)", "not(//a[trace(., '')])", "string(//a)"}) {
+       {"count((//a/string(.), 1))", "count((//a, <a/>))", "not((//a, 1))", "count(//a/string(.))",
+        "exists($g)", "exists(//a/(1, 2))", "count(//a[<x/>])", "exists(//p:a)",
+        "not(//a[trace(., '')])", "string(//a)"}) {
     EXPECT_EQ(operatorsOf("counts", text), 0U) << text;
   }
 }

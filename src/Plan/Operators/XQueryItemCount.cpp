@@ -8,6 +8,7 @@
 #include "Functions/XQueryFunctionCall.h"
 #include "xquery/Number.h"
 
+#include <algorithm>
 #include <optional>
 
 namespace xquery {
@@ -38,11 +39,41 @@ std::optional<uint64_t> countItemsOfCall(const XQueryFunctionCall& call, uint64_
   return call.askBody(ask, context) ? count : std::nullopt;
 }
 
+const XQueryExprList* listWithCommas(const XQueryExpr& expr) {
+  const auto* list = dyn_cast<XQueryExprList>(&expr);
+  return list && list->kind() == Kind::ExprList ? list : nullptr;
+}
+
+const XQueryWalkedPath* pathOfNodesIn(const XQueryExpr& expr) {
+  const XQueryWalkedPath* path = countingPathIn(expr);
+  return path && path->countsNodes() ? path : nullptr;
+}
+
+// One error by itself may be one of what asks for the items.
+std::optional<uint64_t> countItemsOfList(const XQueryExprList& list, uint64_t most,
+                                         XQueryContext& context) {
+  XQueryItemTally tally(most);
+  for (size_t index = 0; index < list.count() && !tally.isComplete(); ++index) {
+    const XQueryExpr& element = *list.objectAtIndex(index);
+    if (const XQueryWalkedPath* path = pathOfNodesIn(element)) {
+      const auto count = path->countNodes(most, context);
+      if (!count) return std::nullopt;
+      tally.addItems(*count);
+      continue;
+    }
+    const Value value = element.evaluateWithContext(context);
+    if (XQueryHasFailed(value, context) || isa<XQueryError>(value)) return std::nullopt;
+    tally.add(value);
+  }
+  return std::min(tally.count(), most);
+}
+
 // None after an error, and where there is no value, as "." has none without a focus.
 std::optional<uint64_t> countItems(const XQueryExpr& expr, uint64_t most, XQueryContext& context) {
   if (const auto* flwor = dyn_cast<XQueryFLWORExpr>(&expr)) return flwor->countItems(most, context);
   const auto* call = dyn_cast<XQueryFunctionCall>(&expr);
   if (call && call->hasBody()) return countItemsOfCall(*call, most, context);
+  if (const auto* list = listWithCommas(expr)) return countItemsOfList(*list, most, context);
   const auto* planned = dyn_cast<XQueryPlannedExpr>(&expr);
   if (planned && planned->walkedPath()) return planned->walkedPath()->countItems(most, context);
   const Value items = expr.evaluateWithContext(context);
@@ -55,6 +86,12 @@ std::optional<uint64_t> countItems(const XQueryExpr& expr, uint64_t most, XQuery
 bool XQueryCountsItems(const XQueryExpr& expr) {
   if (const auto* flwor = dyn_cast<XQueryFLWORExpr>(&expr)) return flwor->orderSpecs().empty();
   if (const auto* call = dyn_cast<XQueryFunctionCall>(&expr)) return call->hasBody();
+  if (const auto* list = listWithCommas(expr)) {
+    for (size_t index = 0; index < list->count(); ++index) {
+      if (pathOfNodesIn(*list->objectAtIndex(index))) return true;
+    }
+    return false;
+  }
   const auto* planned = dyn_cast<XQueryPlannedExpr>(&expr);
   return planned && planned->walkedPath() && planned->walkedPath()->steps().empty();
 }

@@ -1,6 +1,7 @@
 // How many items an expression answers, without a list of them where that is open: "count(E)",
-// "exists(E)", "count(E) > 2", where E is a FLWOR, a filter, or a call of a declared function whose
-// body is a filter or a path; and variables whose values nobody asks for anything else.
+// "exists(E)", "count(E) > 2", where E is a FLWOR, a filter, a call of a declared function whose
+// body is a filter or a path, or what has paths between commas; and variables whose values nobody
+// asks for anything else.
 #pragma once
 
 #include "Plan/Operators/XQueryPathCount.h"
@@ -11,8 +12,10 @@
 
 namespace xquery {
 
-// Whether the expression can count its items without a list of them, perhaps: a FLWOR, a filter or
-// a call of a declared function. For paths of nodes there is XQueryPathCount.
+// Whether the expression can count its items without a list of them, perhaps: a FLWOR, a filter,
+// a call of a declared function, or paths between commas. For paths of nodes there is
+// XQueryPathCount. What has commas must be repeatable: where it counts nothing, it is evaluated
+// anew.
 bool XQueryCountsItems(const XQueryExpr& expr);
 
 class XQueryItemCount : public XQueryPlannedExpr {

@@ -12,6 +12,8 @@
 #include "Platform/Tree/Arena.h"
 #include "Types/XQueryErrors.h"
 
+#include <algorithm>
+
 namespace xquery {
 namespace {
 
@@ -48,6 +50,29 @@ class CountVisit {
   }
 
   const NSXMLExpandedName* _name;
+  XQueryPathResults& _results;
+  XQueryContext& _context;
+};
+
+// The same for a test that takes several names.
+class CountChoiceVisit {
+ public:
+  CountChoiceVisit(XQueryStepTest& test, XQueryPathResults& results, XQueryContext& context)
+      : _test(test), _results(results), _context(context) {}
+
+  bool operator()(NSXMLNode* found) {
+    if (_test.matches(found)) _results.addNode(found, _context);
+    return !_results.isComplete();
+  }
+  bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
+    const auto count =
+        NSXMLCountIndexedElements(*_test.onlyNames(), _test.acceptsInstructions(), first, stop);
+    if (count) _results.addNumber(*count);
+    return count.has_value();
+  }
+
+ private:
+  XQueryStepTest& _test;
   XQueryPathResults& _results;
   XQueryContext& _context;
 };
@@ -235,13 +260,17 @@ void XQueryPathWalk::takeEachKept(size_t index, std::span<NSXMLNode* const> node
   }
 }
 
-// Whether this one walk finds all results, and nothing else is asked of them.
+// Whether nothing is asked of what this walk finds but its number, and no other walk of the step
+// finds the same: from one node, children of children lie beside each other.
 bool XQueryPathWalk::countsInIndex(size_t index, int axis) const {
-  const bool isOnly = index == 0 || (index == 1 && _steps.front().absorbsNext);
   const bool goesDown = axis == XQueryAxisDescendant || axis == XQueryAxisAttributesBelow;
   const XQueryWalkedStep& step = _steps[index];
-  return startsFromOne && isOnly && goesDown && index + 1 == _steps.size() &&
-         results.countsOnly() && !step.hasPredicates() && !setsEveryFocus && !listingStep;
+  if (!goesDown || index + 1 != _steps.size() || step.hasPredicates()) return false;
+  if (!startsFromOne || !results.countsOnly() || setsEveryFocus || listingStep) return false;
+  const bool isJoined = step.axis != axis;  // with the "//" before it
+  const auto before = _steps.first(isJoined ? index - 1 : index);
+  return std::all_of(before.begin(), before.end(),
+                     [](const XQueryWalkedStep& each) { return each.axis == XQueryAxisChild; });
 }
 
 // Whether it is of use to ask the predicates before all nodes are found, and nobody can tell.
@@ -315,8 +344,13 @@ bool XQueryPathWalk::keepNodes(const XQueryExpr& predicate, const XQueryNodeQues
 void XQueryPathWalk::stream(size_t index, int axis, NSXMLNode* node) {
   XQueryStepTest test(_steps[index], *this);
   const NSXMLExpandedName* const name = test.onlyName();
-  if (name && countsInIndex(index, axis)) {
-    XQueryWalkAnyAxis(node, axis, false, CountVisit(name, results, context));
+  const bool isNamed = name || test.onlyNames();
+  if (isNamed && countsInIndex(index, axis)) {
+    if (name) {
+      XQueryWalkAnyAxis(node, axis, false, CountVisit(name, results, context));
+    } else {
+      XQueryWalkAnyAxis(node, axis, false, CountChoiceVisit(test, results, context));
+    }
   } else if (name) {
     streamMatching(index, axis, node, [name](auto act) { return XQueryNamedVisit(name, act); });
   } else if (test.onlyNames()) {

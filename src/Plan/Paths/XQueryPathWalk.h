@@ -23,8 +23,9 @@
 //                 descendants named a are counted by their parents, which come in document order.
 //   lookup        Where a predicate asks for a value that the index of the tree has, the step takes
 //                 the nodes with that value in place of walking (XQueryValueLookup).
-//   countsInIndex Where nothing but the number of all nodes of a name below one node is wanted, it
-//                 is that of a stretch of the index, whose nodes are not looked at.
+//   countsInIndex Where nothing but the number of all nodes of some names below a node is wanted,
+//   it
+//                 is that of stretches of the index, whose nodes are not looked at.
 //   filtersEach   Where only some of the nodes are wanted, or their number, a step filters each
 //                 node as it finds it and hands it on, so that the walk ends as soon as the answer
 //                 is certain.

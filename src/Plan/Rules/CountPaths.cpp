@@ -5,8 +5,9 @@
 //             "or"
 // Facts       E is a path whose last step is an axis step, all of whose tests and predicates can be
 //             repeated and cannot fail once the first step is evaluated
-//             (XQueryWalkedPath::countsNodes); or it is a FLWOR without order specs, a filter, or
-//             a call of a declared function, whose body may be a filter or a path.
+//             (XQueryWalkedPath::countsNodes); or it is a FLWOR without order specs, a filter, a
+//             call of a declared function, whose body may be a filter or a path; or what has such
+//             a path between commas and can be repeated.
 //             Of these only nodes are asked for their truth. They are evaluated to the end unless
 //             they can be repeated, cannot fail but in what the first clause walks, and leave
 //             nothing in variables that can be told. "b[6]", where its truth is asked for, is
@@ -112,6 +113,7 @@ class Search {
     }
     const XQueryFacts& facts = _planning.facts[counted];
     if (!XQueryCountsItems(*items) || (asksForTruth && !facts.are(XQueryItems::Node))) return false;
+    if (items->kind() == Kind::ExprList && !facts.isRepeatable()) return false;
     const bool mayEndEarly = XQueryMayEndEarly(_planning, counted);
     const std::string_view reason =
         question.least == 0 || mayEndEarly

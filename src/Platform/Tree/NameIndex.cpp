@@ -33,9 +33,11 @@ class NSXMLNameIndex::Maker {
   }
 
   void add(const NSXMLNode* node) {
-    size_t place = placeOf(_table, node->expandedName());
-    if (!_table[place].name) place = addName(node->expandedName());
+    const NSXMLName* const written = node->nodeName();
+    size_t place = placeOf(_table, written->expanded);
+    if (!_table[place].name) place = addName(written);
     Name& name = _table[place];
+    if (name.writtenAs != written) name.writtenAs = nullptr;
     ++name.end;
     _numbers.push_back(name.begin);
     _arrived.push_back(node);
@@ -44,10 +46,10 @@ class NSXMLNameIndex::Maker {
   std::unique_ptr<const NSXMLNameIndex> index();
 
  private:
-  size_t addName(const NSXMLExpandedName* name) {
+  size_t addName(const NSXMLName* written) {
     if (2 * (size_t{_nameCount} + 1) > _table.size()) grow();
-    const size_t place = placeOf(_table, name);
-    _table[place] = {name, _nameCount++, 0};
+    const size_t place = placeOf(_table, written->expanded);
+    _table[place] = {written->expanded, written, _nameCount++, 0};
     return place;
   }
   void grow() {
@@ -133,6 +135,15 @@ NSXMLNodeSpan NSXMLNameIndex::nodes(const NSXMLExpandedName* name) const {
   return _nodes.span().subspan(found.begin, found.end - found.begin);
 }
 
+NSXMLNameIndex::Part NSXMLNameIndex::partOf(const Name& name, const NSXMLNameSelection& selection,
+                                            const NSXMLNode* first, const NSXMLNode* stop) const {
+  if (!name.name || !selection.mayTake(*name.name)) return {};
+  const NSXMLNodeSpan all = _nodes.span().subspan(name.begin, name.end - name.begin);
+  const bool areAlike = name.writtenAs != nullptr;
+  if (areAlike && !selection.takes(*all.front())) return {};
+  return {between(all, first, stop), areAlike};
+}
+
 NSXMLNodeList NSXMLNameIndex::nodes(const NSXMLNameSelection& selection, const NSXMLNode* first,
                                     const NSXMLNode* stop) const {
   WorkPacer pacer;
@@ -142,23 +153,44 @@ NSXMLNodeList NSXMLNameIndex::nodes(const NSXMLNameSelection& selection, const N
   };
   NSXMLNodeList found;
   NSXMLNodeList merged;
+  bool areSure = true;
   for (const Name& name : _table) {
     pacer.turn();
-    if (!name.name || !selection.mayTake(*name.name)) continue;
-    const NSXMLNodeSpan all = _nodes.span().subspan(name.begin, name.end - name.begin);
-    const NSXMLNodeSpan more = between(all, first, stop);
+    const Part more = partOf(name, selection, first, stop);
+    if (more.nodes.empty()) continue;
+    areSure = areSure && more.isSure;
     merged.clear();
-    merged.reserve(found.size() + more.size());
+    merged.reserve(found.size() + more.nodes.size());
     const NSXMLNodeSpan before = found.span();
-    std::merge(before.begin(), before.end(), more.begin(), more.end(), std::back_inserter(merged),
-               isBefore);
+    std::merge(before.begin(), before.end(), more.nodes.begin(), more.nodes.end(),
+               std::back_inserter(merged), isBefore);
     std::swap(found, merged);
   }
+  if (areSure) return found;
   found.keepThose([&](const NSXMLNode& node) {
     pacer.turn();
     return selection.takes(node);
   });
   return found;
+}
+
+uint64_t NSXMLNameIndex::count(const NSXMLNameSelection& selection, const NSXMLNode* first,
+                               const NSXMLNode* stop) const {
+  WorkPacer pacer;
+  uint64_t count = 0;
+  for (const Name& name : _table) {
+    pacer.turn();
+    const Part part = partOf(name, selection, first, stop);
+    if (part.isSure) {
+      count += part.nodes.size();
+      continue;
+    }
+    for (const NSXMLNode* node : part.nodes) {
+      pacer.turn();
+      if (selection.takes(*node)) ++count;
+    }
+  }
+  return count;
 }
 
 NSXMLNodeSpan NSXMLNameIndex::between(NSXMLNodeSpan nodes, const NSXMLNode* first,

@@ -25,7 +25,7 @@ class NSXMLNameSelection {
  public:
   // Whether nodes of the expanded name may be among what is looked for.
   virtual bool mayTake(const NSXMLExpandedName& name) const = 0;
-  // Whether such a node is.
+  // Whether such a node is. Nodes that are written alike, with the same prefix, are all or none.
   virtual bool takes(const NSXMLNode& node) const = 0;
 
  protected:
@@ -48,6 +48,10 @@ class NSXMLNameIndex {
   // The nodes of several names, from `first` on before `stop` as below, in document order.
   NSXMLNodeList nodes(const NSXMLNameSelection& selection, const NSXMLNode* first,
                       const NSXMLNode* stop) const;
+  // How many these are, without looking at them but where nodes of one name are written
+  // differently.
+  uint64_t count(const NSXMLNameSelection& selection, const NSXMLNode* first,
+                 const NSXMLNode* stop) const;
   // Whether the tree of an index of elements has processing instructions, which have names too.
   bool hasInstructions() const { return _hasInstructions; }
   // Of nodes in document order those from `first` on that come before `stop`, which is null for the
@@ -60,6 +64,7 @@ class NSXMLNameIndex {
   class Maker;
   struct Name {
     const NSXMLExpandedName* name = nullptr;  // the tree holds it
+    const NSXMLName* writtenAs = nullptr;     // by all of its nodes; null where they differ
     uint32_t begin = 0;
     uint32_t end = 0;
   };
@@ -67,6 +72,14 @@ class NSXMLNameIndex {
   static constexpr size_t bytesPerNode = 2 * sizeof(NSXMLNodePlace) + sizeof(uint32_t);
 
   NSXMLNameIndex() = default;
+  // The nodes of a name from `first` on before `stop`, of which `isSure` tells whether all are
+  // among those of the selection; where not, each has to be asked. Empty for none.
+  struct Part {
+    NSXMLNodeSpan nodes;
+    bool isSure = false;
+  };
+  Part partOf(const Name& name, const NSXMLNameSelection& selection, const NSXMLNode* first,
+              const NSXMLNode* stop) const;
   // The name's own place, or the empty one where it belongs.
   static size_t placeOf(const NSXMLIndexList<Name>& table, const NSXMLExpandedName* name);
 

@@ -199,13 +199,19 @@ IndexesForWalk indexesForWalk(const NSXMLNode* first, const NSXMLNode* stop) {
   return {std::move(indexes), work};
 }
 
+// Null for: walk.
+const NSXMLNameIndex* elementsFor(const IndexesForWalk& walk, bool withInstructions) {
+  const NSXMLNameIndex* const elements = walk.indexes ? walk.indexes->elements(walk.work) : nullptr;
+  return elements && withInstructions && elements->hasInstructions() ? nullptr : elements;
+}
+
 }  // namespace
 
 std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLExpandedName* name,
                                                       const NSXMLNode* first,
                                                       const NSXMLNode* stop) {
   IndexesForWalk walk = indexesForWalk(first, stop);
-  const NSXMLNameIndex* const elements = walk.indexes ? walk.indexes->elements(walk.work) : nullptr;
+  const NSXMLNameIndex* const elements = elementsFor(walk, false);
   if (!elements) return std::nullopt;
   return NSXMLIndexedNodes{std::move(walk.indexes),
                            NSXMLNameIndex::between(elements->nodes(name), first, stop)};
@@ -215,11 +221,19 @@ std::optional<NSXMLIndexedNodes> NSXMLIndexedElements(const NSXMLNameSelection& 
                                                       bool withInstructions, const NSXMLNode* first,
                                                       const NSXMLNode* stop) {
   IndexesForWalk walk = indexesForWalk(first, stop);
-  const NSXMLNameIndex* const elements = walk.indexes ? walk.indexes->elements(walk.work) : nullptr;
-  if (!elements || (withInstructions && elements->hasInstructions())) return std::nullopt;
+  const NSXMLNameIndex* const elements = elementsFor(walk, withInstructions);
+  if (!elements) return std::nullopt;
   NSXMLIndexedNodes found{std::move(walk.indexes), {}, elements->nodes(names, first, stop)};
   found.nodes = found.merged.span();
   return found;
+}
+
+std::optional<uint64_t> NSXMLCountIndexedElements(const NSXMLNameSelection& names,
+                                                  bool withInstructions, const NSXMLNode* first,
+                                                  const NSXMLNode* stop) {
+  const IndexesForWalk walk = indexesForWalk(first, stop);
+  const NSXMLNameIndex* const elements = elementsFor(walk, withInstructions);
+  return elements ? std::optional(elements->count(names, first, stop)) : std::nullopt;
 }
 
 NSXMLIndexedValues NSXMLIndexedValues::of(const NSXMLValueKey& key, const NSXMLNode* first,

@@ -140,6 +140,11 @@ struct NSXMLIndexedNodes {
                                                                     bool withInstructions,
                                                                     const NSXMLNode* first,
                                                                     const NSXMLNode* stop);
+// How many these are.
+[[nodiscard]] std::optional<uint64_t> NSXMLCountIndexedElements(const NSXMLNameSelection& names,
+                                                                bool withInstructions,
+                                                                const NSXMLNode* first,
+                                                                const NSXMLNode* stop);
 // The elements of the name in the key from `first` on before `stop` by their values; null for:
 // walk.
 struct NSXMLIndexedValues {

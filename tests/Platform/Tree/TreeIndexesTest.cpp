@@ -5,6 +5,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/TextTestSupport.h"
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 #include "Platform/Tree/TreeIndexes.h"
 #include "Platform/Tree/XMLTestSupport.h"
 
@@ -136,6 +137,60 @@ TEST(XMLNameIndex, HasWhatAWalkFinds) {
       }
     }
   }
+}
+
+// The local name, in any namespace, as a prefix writes it or as all do.
+class Selection final : public NSXMLNameSelection {
+ public:
+  Selection(std::string written, bool byPrefix)
+      : _written(std::move(written)), _byPrefix(byPrefix) {}
+  bool mayTake(const NSXMLExpandedName& name) const override { return name.localName == A("c"); }
+  bool takes(const NSXMLNode& node) const override {
+    ++asked;
+    return !_byPrefix || node.nameView() == A(_written);
+  }
+  mutable size_t asked = 0;
+
+ private:
+  const std::string _written;
+  const bool _byPrefix;
+};
+
+TEST(XMLNameIndex, CountsWhatItLists) {
+  std::string text = "<r xmlns:n='urn:n' xmlns:m='urn:n'>";
+  for (int i = 0; i < 60; ++i) text += i % 3 ? "<c><n:c/></c>" : "<n:c><c/><m:c/></n:c>";
+  const auto document = parsed(text + "</r>");
+  const auto index = NSXMLNameIndex::ofElements(document.get());
+  const Nodes all = everyNode(document.get());
+  for (const bool byPrefix : {false, true}) {
+    for (const char* written : {"c", "n:c", "m:c"}) {
+      const Selection names(written, byPrefix);
+      for (size_t from = 0; from + 7 < all.size(); from += 7) {
+        const size_t end = all.size() - from / 2;
+        const NSXMLNode* stop = from % 2 && end > from ? all[end] : nullptr;
+        Nodes expected;
+        for (size_t i = from; i < all.size() && all[i] != stop; ++i) {
+          const bool isNamed = all[i]->expandedName() && names.mayTake(*all[i]->expandedName());
+          if (isNamed && names.takes(*all[i])) expected.push_back(all[i]);
+        }
+        const auto listed = index->nodes(names, all[from], stop);
+        ASSERT_EQ(Nodes(listed.begin(), listed.end()), expected);
+        ASSERT_EQ(index->count(names, all[from], stop), expected.size());
+      }
+    }
+  }
+}
+
+// Of those that are written in one way one tells for all.
+TEST(XMLNameIndex, AsksOneNodeOfThoseWrittenAlike) {
+  std::string text = "<r>";
+  for (int i = 0; i < 60; ++i) text += "<c/><d/>";
+  const auto document = parsed(text + "</r>");
+  const auto index = NSXMLNameIndex::ofElements(document.get());
+  const Selection names("c", true);
+  EXPECT_EQ(index->count(names, document.get(), nullptr), 60U);
+  EXPECT_EQ(index->nodes(names, document.get(), nullptr).size(), 60U);
+  EXPECT_EQ(names.asked, 2U);
 }
 
 TEST(XMLNameIndex, HoldsAsManyNamesAsTheTreeHas) {
