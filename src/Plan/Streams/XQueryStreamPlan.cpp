@@ -1,0 +1,327 @@
+#include "Plan/Streams/XQueryStreamPlan.h"
+
+#include "Expr/Clauses/XQueryFLWOR.h"
+#include "Expr/Clauses/XQueryQuantified.h"
+#include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/Paths/XQueryPath.h"
+#include "Expr/XQueryLeaves.h"
+#include "Functions/XQueryBuiltInFunction.h"
+#include "Functions/XQueryFunctionCall.h"
+#include "Plan/Rules/PlaceInside.h"
+
+#include <optional>
+#include <utility>
+
+namespace xquery {
+
+namespace {
+
+// From an element of at most so many levels the descendant axis stays inside: were there neither a
+// next sibling of it nor of its parent, then nothing follows it.
+constexpr size_t levelsThatHoldDescendants = 3;
+
+struct FoldOfFunction {
+  std::string_view name;
+  XQueryStreamFold fold;
+};
+
+constexpr FoldOfFunction folds[] = {
+    {"count", XQueryStreamFold::Count},      {"sum", XQueryStreamFold::Sum},
+    {"avg", XQueryStreamFold::Average},      {"min", XQueryStreamFold::Least},
+    {"max", XQueryStreamFold::Greatest},     {"exists", XQueryStreamFold::Exists},
+    {"empty", XQueryStreamFold::Empty},      {"distinct-values", XQueryStreamFold::Distinct},
+    {"subsequence", XQueryStreamFold::Part},
+};
+
+struct Refusal {
+  XQueryPlaceID place;
+  std::string_view reason;
+};
+
+[[noreturn]] void refuse(XQueryPlaceID place, std::string_view reason) {
+  throw Refusal{place, reason};
+}
+
+bool asksForAnyNode(const XQueryExpr* test) {
+  const auto* type = dyn_cast<XQueryTypeDeclaration>(test);
+  return type && type->type() == XQueryTypeDeclaration::AnyKindTest;
+}
+
+bool asksForAnyElement(const XQueryExpr* test) {
+  const auto* wildCard = dyn_cast<XQueryWildCardNameTest>(test);
+  return wildCard && !wildCard->prefix() && !wildCard->localName();
+}
+
+// Goes over the program from the body to the path that finds the records.
+class Analysis {
+ public:
+  Analysis(const XQueryProgram& program, const XQueryFactTable& facts)
+      : _program(program), _facts(facts) {}
+
+  XQueryStreamPlan run() {
+    try {
+      checkGlobals();
+      takeBody(_program.bodies().back().place);
+    } catch (const Refusal& refusal) {
+      _plan.refusedAt = refusal.place;
+      _plan.reason = refusal.reason;
+    }
+    return std::move(_plan);
+  }
+
+ private:
+  const XQueryExpr* exprAt(XQueryPlaceID place) const { return _program[place].expr; }
+  XQueryPlaceID inside(XQueryPlaceID place) const { return XQueryPlaceInside(_program, place); }
+
+  // Globals are evaluated before the first record is read.
+  void checkGlobals() const {
+    for (const XQueryProgramBody& body : _program.bodies()) {
+      if (body.variable && _facts[body.place].does(XQueryDeeds::ReadsFocus)) {
+        refuse(body.place, "a global variable reads the document");
+      }
+    }
+  }
+
+  // --- folds -----------------------------------------------------------------------------------
+
+  void takeBody(XQueryPlaceID body) {
+    const XQueryPlaceID place = inside(body);
+    _plan.each = place;
+    if (isa<XQueryFunctionCall>(exprAt(place))) return takeCall(place);
+    if (takePosition(place)) return;
+    if (const auto* quantifier = dyn_cast<XQueryQuantifiedExpr>(exprAt(place))) {
+      _plan.fold = quantifier->every() ? XQueryStreamFold::Every : XQueryStreamFold::Some;
+      return takeClauses(place);
+    }
+    takeItems(place);
+  }
+
+  void takeCall(XQueryPlaceID place) {
+    const auto* call = cast<XQueryFunctionCall>(exprAt(place));
+    const XQueryPlaceID arguments = _program.part(place, XQueryRole::Arguments);
+    const XQueryPlaceID first =
+        arguments == XQueryNoPlace ? arguments : _program.firstPart(arguments);
+    const size_t count = call->args() ? call->args()->count() : 0;
+    if (call->builtIn() && first != XQueryNoPlace) {
+      for (const FoldOfFunction& row : folds) {
+        if (row.name != call->builtIn()->row().localName) continue;
+        if (row.fold == XQueryStreamFold::Part) {
+          takeSubsequence(first, count);
+        } else if (count != 1) {
+          refuse(place, "the function has more than one argument");
+        }
+        _plan.fold = row.fold;
+        _plan.each = first;
+        return takeItems(inside(first));
+      }
+    }
+    refuse(place, "the function needs the whole of its argument");
+  }
+
+  std::optional<uint64_t> literalAt(XQueryPlaceID place) const {
+    return XQueryStep::literalPositionOf(exprAt(inside(place)));
+  }
+
+  void takeSubsequence(XQueryPlaceID first, size_t count) {
+    const XQueryPlaceID start = _program.nextPart(first);
+    const XQueryPlaceID length = count == 3 ? _program.nextPart(start) : XQueryNoPlace;
+    const auto from = start == XQueryNoPlace ? std::nullopt : literalAt(start);
+    if (!from || *from < 1) refuse(first, "the first position is no number that is written there");
+    _plan.first = *from;
+    if (length == XQueryNoPlace) return;
+    const auto number = literalAt(length);
+    if (!number) refuse(length, "the number of items is not written there");
+    _plan.last = *from - 1 + *number;
+  }
+
+  // (...)[3]
+  bool takePosition(XQueryPlaceID place) {
+    const auto* path = dyn_cast<XQueryPathExpr>(exprAt(place));
+    const XQueryStep* step = path ? path->step() : nullptr;
+    const bool isFiltered = step && step->kind() == Kind::FilterStep && !step->next() &&
+                            step->predicates().size() == 1 && step->asksForPosition(0);
+    if (!isFiltered) return false;
+    _plan.fold = XQueryStreamFold::Part;
+    _plan.first = _plan.last = *step->literalPosition(0);
+    _plan.each = _program.firstPart(place);
+    takeItems(inside(_plan.each));
+    return true;
+  }
+
+  // --- what is evaluated for each record -------------------------------------------------------
+
+  void takeItems(XQueryPlaceID place) {
+    switch (exprAt(place)->kind()) {
+      case Kind::PathExpr:
+        return takePath(place);
+      case Kind::FLWORExpr:
+        if (!cast<XQueryFLWORExpr>(exprAt(place))->orderSpecs().empty()) {
+          refuse(place, "order by sorts what is found in all records");
+        }
+        return takeClauses(place);
+      default:
+        refuse(place, "no path goes through the document record by record");
+    }
+  }
+
+  void takeClauses(XQueryPlaceID place) {
+    XQueryPlaceID clause = _program.firstPart(place);
+    const XQueryExpr* binder = clause == XQueryNoPlace ? nullptr : exprAt(clause);
+    const auto* forClause = dyn_cast<XQueryForExpr>(binder);
+    if (!forClause && !isa<XQueryQuantifiedExprItem>(binder)) {
+      refuse(clause == XQueryNoPlace ? place : clause,
+             "the first clause does not go through a path");
+    }
+    if (forClause && forClause->posVarID() != 0) {
+      refuse(clause, "the records before it are counted");
+    }
+    const XQueryPlaceID bound = _program.part(clause, XQueryRole::Bound);
+    if (bound == XQueryNoPlace || !isa<XQueryPathExpr>(exprAt(inside(bound)))) {
+      refuse(clause, "the first clause does not go through a path");
+    }
+    takePath(inside(bound));
+    while ((clause = _program.nextPart(clause)) != XQueryNoPlace) checkInside(clause);
+  }
+
+  // Whatever is evaluated there starts from the record.
+  void checkInside(XQueryPlaceID place) const {
+    using namespace XQueryDeeds;
+    if (_facts[place].does(ReadsItem | ReadsPosition | ReadsSize)) {
+      refuse(place, "it reads the document apart from the record");
+    }
+    checkStaysInside(place);
+  }
+
+  // The innermost place is told of; of a path from the root the path, since "/" is one object.
+  void checkStaysInside(XQueryPlaceID place) const {
+    for (XQueryPlaceID each = _program[place].end; each-- > place;) {
+      const bool isRoot = isa<XQueryRootStepExpr>(exprAt(each)) && each > place;
+      const XQueryPlaceID shown = isRoot ? _program[each].parent : each;
+      if (_facts[each].does(XQueryDeeds::ReadsRoot)) {
+        refuse(shown, "it reads the document apart from the record");
+      }
+      if (_facts[each].does(XQueryDeeds::ReadsOutside)) {
+        refuse(shown, "it may lead out of the record");
+      }
+    }
+  }
+
+  // --- the path --------------------------------------------------------------------------------
+
+  void takePath(XQueryPlaceID place) {
+    _part = _program.firstPart(place);
+    const XQueryStep* step = cast<XQueryPathExpr>(exprAt(place))->step();
+    if (isa<XQueryRootStep>(step)) {
+      _part = _program.nextPart(_part);
+      step = step->next();
+    } else if (!isa<XQueryAxisStep>(step) || _program[place].focus != XQueryNoPlace) {
+      refuse(place, "the path does not begin at the document");
+    }
+    while (step && takeRecordStep(*step, place)) step = step->next();
+    if (_isAnywhere) refuse(place, "any node may be a record");
+    const bool isWhole =
+        _plan.record.size() < 2 && (_plan.record.empty() || !_plan.record.front().isAnywhere);
+    if (isWhole) refuse(place, "the whole document would be one record");
+    for (; step; step = step->next()) takeInnerStep(*step, place);
+  }
+
+  // Whether more steps may belong to the way to the record. Moves on behind the step.
+  bool takeRecordStep(const XQueryStep& step, XQueryPlaceID path) {
+    const auto* axisStep = dyn_cast<XQueryAxisStep>(&step);
+    if (!axisStep || _isComplete) return false;
+    const XQueryExpr* test = axisStep->expr();
+    const bool hasPredicates = !step.predicates().empty();
+    if (axisStep->axis() == XQueryAxisDescendantOrSelf && asksForAnyNode(test) && !hasPredicates) {
+      beginAnywhere(path);
+      _part = _program.nextPart(_part);
+      return true;
+    }
+    const bool isDescendant = axisStep->axis() == XQueryAxisDescendant;
+    const auto* name = dyn_cast<XQueryNameTest>(test);
+    const bool isElement = (name && !name->attribute()) || asksForAnyElement(test);
+    if ((axisStep->axis() != XQueryAxisChild && !isDescendant) || !isElement) return false;
+    if (countsPositions(step)) {
+      if (isDescendant || _isAnywhere) refuse(path, "positions are counted below any element");
+      return false;
+    }
+    if (isDescendant) beginAnywhere(path);
+    _plan.record.push_back({std::exchange(_isAnywhere, false), name});
+    _part = _program.nextPart(_part);
+    checkPredicates(step);
+    // What a predicate looks at is below its step.
+    _isComplete = hasPredicates;
+    return true;
+  }
+
+  void beginAnywhere(XQueryPlaceID path) {
+    bool isAnywhere = _isAnywhere;
+    for (const XQueryStreamStep& step : _plan.record) isAnywhere = isAnywhere || step.isAnywhere;
+    if (isAnywhere || _plan.record.size() > levelsThatHoldDescendants) {
+      refuse(path, "the descendant axis may lead out of its node");
+    }
+    _isAnywhere = true;
+  }
+
+  // Whether a predicate of the step depends on which nodes there are beside the one that it is
+  // asked for.
+  bool countsPositions(const XQueryStep& step) const {
+    XQueryPlaceID predicate = _program.nextPart(_part);
+    for (size_t index = 0; index < step.predicates().size(); ++index) {
+      if (step.asksForPosition(index)) return true;
+      if (!step.predicates()[index]) break;
+      const XQueryFacts& facts = _facts[predicate];
+      if (facts.does(XQueryDeeds::ReadsPosition | XQueryDeeds::ReadsSize) ||
+          facts.mayBe(XQueryItems::Numeric | XQueryItems::Other)) {
+        return true;
+      }
+      predicate = _program.nextPart(predicate);
+    }
+    return false;
+  }
+
+  void checkPredicates(const XQueryStep& step) {
+    for (const auto& predicate : step.predicates()) {
+      if (!predicate) break;
+      checkStaysInside(_part);
+      _part = _program.nextPart(_part);
+    }
+  }
+
+  void takeInnerStep(const XQueryStep& step, XQueryPlaceID path) {
+    const auto* axisStep = dyn_cast<XQueryAxisStep>(&step);
+    if (axisStep) {
+      const int axis = axisStep->axis();
+      if (axis != XQueryAxisChild && axis != XQueryAxisAttribute && axis != XQueryAxisSelf) {
+        refuse(path, "a step may lead out of the record");
+      }
+    } else if (step.expr()) {
+      checkStaysInside(_part);
+    }
+    if (step.expr()) _part = _program.nextPart(_part);
+    checkPredicates(step);
+  }
+
+  const XQueryProgram& _program;
+  const XQueryFactTable& _facts;
+  XQueryStreamPlan _plan;
+  XQueryPlaceID _part = XQueryNoPlace;  // of the path, the next of those of the step at hand
+  bool _isAnywhere = false;             // "//" has been met and waits for the name behind it
+  bool _isComplete = false;
+};
+
+}  // namespace
+
+std::string XQueryStreamPlan::recordPath() const {
+  std::string path;
+  for (const XQueryStreamStep& step : record) {
+    path += step.isAnywhere ? "//" : "/";
+    path += step.name ? step.name->name()->utf8() : "*";
+  }
+  return path;
+}
+
+XQueryStreamPlan XQueryPlanStream(const XQueryProgram& program, const XQueryFactTable& facts) {
+  return Analysis(program, facts).run();
+}
+
+}  // namespace xquery

@@ -1,0 +1,77 @@
+// Whether a program can be evaluated record by record, and how.
+//
+// A record is a subtree of the document that is evaluated, over all of the program's expressions as
+// they are, in a document that holds the record, the elements above it with their attributes and
+// namespaces, and nothing else. What this answers for one record after the other is what the whole
+// document would have answered where
+//
+//   - the body is a path, a FLWOR or a quantifier over a path, or one function or position of such,
+//     whose value is put together from those of the records (the fold);
+//   - everything in it starts from that path, and nothing leaves the nodes that it finds or counts
+//     them among others.
+//
+// The record is what the longest beginning of the path finds that asks for names alone: predicates
+// look at what is below their step, and positions at what is beside it.
+//
+// The descendant axis ends where the next sibling of its node or of that one's parent begins, and
+// with the document where there is neither: from deep inside of a record it may lead out of it. So
+// it may only stand at the beginning of the path, not more than three levels down.
+#pragma once
+
+#include "Plan/FactsAnalysis.h"
+#include "Plan/Program.h"
+
+#include <cstdint>
+#include <limits>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace xquery {
+
+class XQueryNameTest;
+
+struct XQueryStreamStep {
+  bool isAnywhere;             // below, not a child
+  const XQueryNameTest* name;  // null for any element
+};
+
+// What is made of the values of the records.
+enum class XQueryStreamFold : uint8_t {
+  Items,  // they are the value, one behind the other
+  Count,
+  Sum,
+  Average,
+  Least,
+  Greatest,
+  Exists,
+  Empty,
+  Distinct,
+  Some,
+  Every,
+  Part,  // the items of some positions
+};
+
+struct XQueryStreamPlan {
+  std::vector<XQueryStreamStep> record;
+  XQueryStreamFold fold = XQueryStreamFold::Items;
+  // Of a part: the positions of its items.
+  uint64_t first = 1;
+  uint64_t last = std::numeric_limits<uint64_t>::max();
+  // What is evaluated for each record.
+  XQueryPlaceID each = XQueryNoPlace;
+
+  // Where and why the program cannot be evaluated so; no place where it can.
+  XQueryPlaceID refusedAt = XQueryNoPlace;
+  std::string_view reason;
+
+  bool isPossible() const { return refusedAt == XQueryNoPlace; }
+  // As a path: "/site/people/person", "//item".
+  std::string recordPath() const;
+};
+
+// Of a program with a body, as it was written: before rules have changed it.
+[[nodiscard]] XQueryStreamPlan XQueryPlanStream(const XQueryProgram& program,
+                                                const XQueryFactTable& facts);
+
+}  // namespace xquery
