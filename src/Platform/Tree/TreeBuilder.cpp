@@ -1,6 +1,8 @@
 #include "Platform/Tree/TreeBuilder.h"
 
 #include "Platform/Base/LastingObjects.h"
+#include "Platform/Base/RangeMemory.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/Blocks.h"
 
 #include <algorithm>
@@ -32,13 +34,23 @@ void NSXMLTreeBuilder::refuseNode() {
 
 // --- room ------------------------------------------------------------------------------------
 
+constexpr size_t mostNodeRoom = NSXMLTree::largestNodeBlock - sizeof(NSXMLBlock);
+
 void NSXMLTreeBuilder::startNodeBlock(size_t bytes) {
-  constexpr size_t most = NSXMLTree::largestNodeBlock - sizeof(NSXMLBlock);
-  _nodeBlock = _tree->allocateBlock(std::max(_nextNodeBlock, bytes));
-  const size_t room = std::min(NSXMLTree::roomOf(_nodeBlock), most);
-  _nodeCursor = reinterpret_cast<char*>(_nodeBlock + 1);
-  _nodeEnd = _nodeCursor + room;
-  _nextNodeBlock = std::min(room * 2, most);
+  beginNodeBlock(_tree->allocateBlock(std::max(_nextNodeBlock, bytes)));
+  _nextNodeBlock = std::min(static_cast<size_t>(_nodeEnd - _nodeCursor) * 2, mostNodeRoom);
+}
+
+void NSXMLTreeBuilder::beginNodeBlock(NSXMLBlock* block) {
+  _nodeBlock = block;
+  _nodeCursor = reinterpret_cast<char*>(block + 1);
+  _nodeEnd = _nodeCursor + std::min(NSXMLTree::roomOf(block), mostNodeRoom);
+}
+
+void NSXMLTreeBuilder::beginTextBlock(NSXMLBlock* block) {
+  _textBlock = block;
+  _textCursor = reinterpret_cast<char*>(block + 1);
+  _textEnd = _textCursor + NSXMLTree::roomOf(block);
 }
 
 // At an even address, for texts in UTF-16.
@@ -49,9 +61,7 @@ char* NSXMLTreeBuilder::takeTextRoom(size_t bytes) {
     if (rounded > _nextTextBlock / 4) {
       return reinterpret_cast<char*>(_tree->allocateBlock(rounded) + 1);
     }
-    NSXMLBlock* const block = _tree->allocateBlock(_nextTextBlock);
-    _textCursor = reinterpret_cast<char*>(block + 1);
-    _textEnd = _textCursor + NSXMLTree::roomOf(block);
+    beginTextBlock(_tree->allocateBlock(_nextTextBlock));
     _nextTextBlock = std::min(_nextTextBlock * 2, largestTextBlock);
   }
   char* const room = _textCursor;
@@ -126,6 +136,86 @@ NSXMLNode* NSXMLTreeBuilder::addInstruction(const NSXMLName* target, const NSStr
 
 NSXMLNode* NSXMLTreeBuilder::addInstruction(const NSXMLName* target, NSStringView text) {
   return addInstruction(target, store(text));
+}
+
+// --- going back --------------------------------------------------------------------------------
+
+// Before the first block, where no mark lies behind it.
+const NSStringView* NSXMLTreeBuilder::storeLasting(NSStringView text) {
+  NSXMLBlock* const last = _tree->_lastBlock;
+  NSXMLBlock* const block = _tree->allocateBlock(sizeof(NSStringView) + bytesOf(text));
+  if (last) _tree->_lastBlock = last;
+  char* const units = reinterpret_cast<char*>(block + 1) + sizeof(NSStringView);
+  if (bytesOf(text)) std::memcpy(units, unitsOf(text), bytesOf(text));
+  const NSStringView stored =
+      text.isWide() ? NSStringView(reinterpret_cast<const char16_t*>(units), text.length())
+                    : NSStringView::ascii({units, text.length()});
+  return ::new (block + 1) NSStringView(stored);
+}
+
+NSXMLTreeBuilder::Mark NSXMLTreeBuilder::mark() const {
+  return {_tree->_lastBlock, _nodeBlock, _nodeCursor, _nodeEnd, _textBlock,
+          _textCursor,       _textEnd,   _nextNumber, _current, _lastChild};
+}
+
+void NSXMLTreeBuilder::freeBlocksBehind(NSXMLBlock* last, const NSXMLBlock* butNodes,
+                                        const NSXMLBlock* butTexts) {
+  NSXMLBlock* const first = _tree->_lastBlock->next;
+  uint64_t count = _tree->blockCount();
+  for (NSXMLBlock* block = last->next; block != first;) {
+    NSXMLBlock* const next = block->next;
+    if (block == butNodes || block == butTexts) {
+      last->next = block;
+      last = block;
+    } else {
+      uncountValueBytes(sizeof(NSXMLBlock) + NSXMLTree::roomOf(block));
+      giveRangeBlock(block);
+      --count;
+    }
+    block = next;
+  }
+  last->next = first;
+  _tree->_lastBlock = last;
+  _tree->setBlockCount(count);
+}
+
+// Of the blocks begun since, the newest are the largest: these are filled again, and soon
+// everything fits into them.
+void NSXMLTreeBuilder::backTo(const Mark& mark) {
+  _tree->dropIndexes();
+  const bool keepsNodes = _nodeBlock != mark.nodeBlock;
+  const bool keepsTexts = _textBlock != mark.textBlock;
+  freeBlocksBehind(mark.lastBlock, keepsNodes ? _nodeBlock : nullptr,
+                   keepsTexts ? _textBlock : nullptr);
+  if (keepsNodes) {
+    beginNodeBlock(_nodeBlock);
+  } else {
+    _nodeCursor = mark.nodeCursor;
+    _nodeEnd = mark.nodeEnd;
+  }
+  if (keepsTexts) {
+    beginTextBlock(_textBlock);
+  } else {
+    _textCursor = mark.textCursor;
+    _textEnd = mark.textEnd;
+  }
+  _nextNumber = mark.nextNumber;
+  _current = mark.current;
+  _lastChild = mark.lastChild;
+  _lastProperty = nullptr;
+  if (_lastChild) {
+    NSXMLTree::nextOf(_lastChild) = nullptr;
+  } else {
+    NSXMLTree::firstChildOf(_current) = nullptr;
+  }
+}
+
+void NSXMLTreeBuilder::endOpenNodes() {
+  NSXMLNode* last = _lastChild;
+  for (NSXMLNode* node = _current; node; node = node->parent()) {
+    if (NSXMLNode* const first = NSXMLTree::firstChildOf(node)) NSXMLTree::previousOf(first) = last;
+    last = node;
+  }
 }
 
 NSXMLNode* NSXMLTreeBuilder::finish() {

@@ -42,6 +42,31 @@ class NSXMLTreeBuilder {
   char16_t* roomForUnits(size_t count);
   const NSStringView* storeFilled(NSStringView text);
 
+  // A text that stays where it is when its builder goes back.
+  const NSStringView* storeLasting(NSStringView text);
+
+  // --- going back ------------------------------------------------------------------------------
+  // A place between two children of the open node. Of a document that is read part by part, each
+  // is built, looked at and dropped: the next one takes the same memory and the same numbers.
+  struct Mark {
+    NSXMLBlock* lastBlock;
+    NSXMLBlock* nodeBlock;
+    char* nodeCursor;
+    char* nodeEnd;
+    NSXMLBlock* textBlock;
+    char* textCursor;
+    char* textEnd;
+    uint32_t nextNumber;
+    NSXMLNode* current;
+    NSXMLNode* lastChild;
+  };
+  Mark mark() const;
+  // As if nothing had been added since; what was is gone, so that nobody may refer to it. The node
+  // that was open must be, and be the innermost. Names stay, and so do lasting texts.
+  void backTo(const Mark& mark);
+  // What is there can be walked, as if the open nodes ended here; more may be added afterwards.
+  void endOpenNodes();
+
   // What a node of the kind and its text take of nodes and of texts.
   static void addRoom(Kind kind, NSStringView text, size_t& nodeBytes, size_t& textBytes);
 
@@ -72,6 +97,9 @@ class NSXMLTreeBuilder {
     return room;
   }
   void startNodeBlock(size_t bytes);
+  void beginNodeBlock(NSXMLBlock* block);
+  void beginTextBlock(NSXMLBlock* block);
+  void freeBlocksBehind(NSXMLBlock* last, const NSXMLBlock* butNodes, const NSXMLBlock* butTexts);
   char* takeTextRoom(size_t bytes);
 
   template <class Node>
@@ -99,6 +127,7 @@ class NSXMLTreeBuilder {
   NSXMLBlock* _nodeBlock = nullptr;
   char* _nodeCursor = nullptr;
   char* _nodeEnd = nullptr;
+  NSXMLBlock* _textBlock = nullptr;
   char* _textCursor = nullptr;
   char* _textEnd = nullptr;
   size_t _nextNodeBlock;
