@@ -88,6 +88,23 @@ const NSStringView* ReadTree::stored(const ReadText& text) {
   return withStorable(text, Storing{_builder});
 }
 
+const NSStringView* ReadTree::storedLasting(const ReadText& text) {
+  struct Storing {
+    NSXMLTreeBuilder& builder;
+    const NSStringView* operator()(NSStringView view) const { return builder.storeLasting(view); }
+    const NSStringView* operator()(const NSStringView* stored) const {
+      return builder.storeLasting(*stored);
+    }
+  };
+  return withStorable(text, Storing{_builder});
+}
+
+void ReadTree::backTo(const NSXMLTreeBuilder::Mark& mark) {
+  _pending.clear();
+  _pendingIsExact = false;
+  _builder.backTo(mark);
+}
+
 NSXMLNode* ReadTree::addLeaf(Kind kind, const ReadText& text) {
   return withStorable(text, [&](auto storable) { return _builder.addLeaf(kind, storable); });
 }

@@ -47,6 +47,14 @@ class ReadTree {
   void addInstruction(const NSXMLName* target, const ReadText& text);
   // For nodes to share.
   const NSStringView* stored(const ReadText& text);
+  const NSStringView* storedLasting(const ReadText& text);
+
+  // --- reading part by part ----------------------------------------------------------------------
+  NSXMLNode* current() const { return _builder.current(); }
+  NSXMLTreeBuilder::Mark mark() const { return _builder.mark(); }
+  // Text that is still pending is gone as well.
+  void backTo(const NSXMLTreeBuilder::Mark& mark);
+  void endOpenNodes() { _builder.endOpenNodes(); }
 
  private:
   // An element under which xml:space changes what is kept.

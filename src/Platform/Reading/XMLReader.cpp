@@ -14,10 +14,12 @@
 #include "Platform/Reading/References.h"
 #include "Platform/Reading/XMLCharacters.h"
 #include "Platform/Reading/XMLProlog.h"
+#include "Platform/Reading/XMLRecords.h"
 #include "Platform/Text/ASCII.h"
 #include "Platform/Text/UTF8.h"
 
 #include <algorithm>
+#include <bit>
 #include <cstring>
 #include <new>
 
@@ -40,6 +42,14 @@ class XMLReader {
       : _source(source), _tree(options, source.expectedBytes()), _names(_tree.tree()) {}
   NSXMLDocument* read();
 
+  // --- record by record ------------------------------------------------------------------------
+  // Before the first record.
+  NSXMLDocument* beginRecords(std::span<const XMLRecordStep> path);
+  // Null at the end of the document.
+  const NSXMLElement* readRecord();
+  // The tree is its owner's.
+  void letGoOfTree() { static_cast<void>(_tree.finish()); }
+
  private:
   // What has been seen of a run of text or a value: whether it stands for itself.
   struct Raw {
@@ -57,7 +67,12 @@ class XMLReader {
   };
 
   bool getMore();
+  void start();
   const char* readPiece(const char* at);
+  bool readNextPiece();
+  const NSXMLElement* closedRecord();
+  const NSXMLElement* lookAtPiece(size_t depthBefore);
+  uint64_t enter(const NSXMLElement* element) const;
   const char* readProlog(const char* at);
   const char* readSpaceAround(const char* at);
   const char* readMarkup(const char* at);
@@ -102,6 +117,16 @@ class XMLReader {
   bool _hasBegun = false;
   bool _hasType = false;
   bool _hasRoot = false;
+
+  // Outside of records, of the document and each open element: where to go back to, and how many
+  // steps of the path lead there, as bits.
+  struct Level {
+    NSXMLTreeBuilder::Mark mark;
+    uint64_t matched;
+  };
+  std::vector<Level, ValueAllocator<Level>> _levels;
+  std::span<const XMLRecordStep> _path;
+  size_t _recordDepth = 0;  // of the record that is being read; 0 outside
 };
 
 // --- the whole -------------------------------------------------------------------------------
@@ -114,10 +139,14 @@ bool XMLReader::getMore() {
   return isMore;
 }
 
-NSXMLDocument* XMLReader::read() {
+void XMLReader::start() {
   _at = _source.begin();
   _end = _source.end();
   _text.start(_at, _end);
+}
+
+NSXMLDocument* XMLReader::read() {
+  start();
   for (;;) {
     const char* const next = _at == _end ? nullptr : readPiece(_at);
     if (next) {
@@ -128,6 +157,86 @@ NSXMLDocument* XMLReader::read() {
   }
   take(_at == _end && _open.empty() && _hasRoot);
   return _tree.finish();
+}
+
+// --- record by record ------------------------------------------------------------------------
+//
+// A loop of its own, so that nothing of this is asked where a document is read as a whole. What a
+// piece has done shows in the number of open elements. Outside of records every piece but the open
+// elements is dropped at once.
+
+// False at the end of the text.
+bool XMLReader::readNextPiece() {
+  for (;;) {
+    const char* const next = _at == _end ? nullptr : readPiece(_at);
+    if (next) {
+      _at = next;
+      return true;
+    }
+    if (!getMore() && (_hasBegun || _at == _end)) return false;
+  }
+}
+
+NSXMLDocument* XMLReader::beginRecords(std::span<const XMLRecordStep> path) {
+  _path = path;
+  _levels.push_back({_tree.mark(), 1});
+  start();
+  return cast<NSXMLDocument>(_tree.current());
+}
+
+// The steps that are matched where the element stands; all of them for a record.
+uint64_t XMLReader::enter(const NSXMLElement* element) const {
+  uint64_t matched = 0;
+  for (uint64_t left = _levels.back().matched; left != 0; left &= left - 1) {
+    const auto index = static_cast<size_t>(std::countr_zero(left));
+    const XMLRecordStep& step = _path[index];
+    if (step.isAnywhere) matched |= uint64_t{1} << index;
+    if (!step.name || step.name == element->expandedName()) matched |= uint64_t{2} << index;
+  }
+  return matched;
+}
+
+const NSXMLElement* XMLReader::closedRecord() {
+  _recordDepth = 0;
+  _tree.endOpenNodes();
+  return cast<NSXMLElement>(_tree.current()->firstChild());
+}
+
+// After a piece outside of records. The record, if it was a whole one. Whatever was before it below
+// the open element is gone.
+const NSXMLElement* XMLReader::lookAtPiece(size_t depthBefore) {
+  const size_t depth = _open.size();
+  if (depth < depthBefore) _levels.pop_back();
+  const bool isOpen = depth > depthBefore;
+  const NSXMLNode* const added = isOpen ? _tree.current() : _tree.current()->firstChild();
+  const auto* element = depth < depthBefore ? nullptr : dyn_cast<NSXMLElement>(added);
+  if (element) {
+    const uint64_t matched = enter(element);
+    const bool isRecord = (matched >> _path.size()) != 0;
+    if (isRecord && !isOpen) return closedRecord();
+    if (isRecord) {
+      _recordDepth = depth;
+      return nullptr;
+    }
+    if (isOpen) _levels.push_back({_tree.mark(), matched});
+  }
+  _tree.backTo(_levels.back().mark);
+  return nullptr;
+}
+
+const NSXMLElement* XMLReader::readRecord() {
+  _tree.backTo(_levels.back().mark);
+  for (;;) {
+    const size_t depthBefore = _open.size();
+    if (!readNextPiece()) break;
+    if (_recordDepth != 0) {
+      if (_open.size() < _recordDepth) return closedRecord();
+    } else if (const NSXMLElement* record = lookAtPiece(depthBefore)) {
+      return record;
+    }
+  }
+  take(_at == _end && _open.empty() && _hasRoot);
+  return nullptr;
 }
 
 const char* XMLReader::readPiece(const char* at) {
@@ -324,7 +433,9 @@ ReadText XMLReader::valueOf(const Raw& value) {
 
 void XMLReader::declareNamespaces() {
   _names.startTag();
-  const auto store = [this](std::string_view URI) { return _tree.stored(ReadText(URI)); };
+  const auto store = [this](std::string_view URI) {
+    return _levels.empty() ? _tree.stored(ReadText(URI)) : _tree.storedLasting(ReadText(URI));
+  };
   for (Attribute& attribute : _attributes) {
     if (!attribute.name->declares) continue;
     attribute.URI = _names.declare(*attribute.name->declares, valueOf(attribute.value).bytes,
@@ -441,6 +552,58 @@ const char* XMLReader::readInstruction(const char* at) {
 }
 
 }  // namespace
+
+// --- the doors -------------------------------------------------------------------------------
+
+class XMLRecords::Reading {
+ public:
+  Reading(TextSource& source, std::span<const XMLRecordStep> path, uint32_t options)
+      : _path(path.begin(), path.end()),
+        _reader(source, options),
+        _document(_reader.beginRecords(_path)) {}
+  ~Reading() { _reader.letGoOfTree(); }
+  Reading(const Reading&) = delete;
+  Reading& operator=(const Reading&) = delete;
+
+  const NSXMLElement* next() {
+    if (_isOver) return nullptr;
+    const NSXMLElement* record = nullptr;
+    try {
+      record = _reader.readRecord();
+      _isAtEnd = !record;
+    } catch (const NotTaken&) {
+    } catch (const LibXMLStop&) {
+    }
+    _isOver = !record;
+    return record;
+  }
+  bool isAtEnd() const { return _isAtEnd; }
+  NSXMLDocument* document() const { return _document.get(); }
+
+ private:
+  const std::vector<XMLRecordStep> _path;
+  XMLReader _reader;
+  const Ref<NSXMLDocument> _document;
+  bool _isOver = false;
+  bool _isAtEnd = false;
+};
+
+XMLRecords::XMLRecords(TextSource& source, std::span<const XMLRecordStep> path, uint32_t options)
+    : _reading(std::make_unique<Reading>(source, path, options)) {}
+
+XMLRecords::~XMLRecords() = default;
+
+const NSXMLElement* XMLRecords::next() {
+  return _reading->next();
+}
+
+bool XMLRecords::isAtEnd() const {
+  return _reading->isAtEnd();
+}
+
+NSXMLDocument* XMLRecords::document() const {
+  return _reading->document();
+}
 
 Ref<NSXMLDocument> readXML(TextSource& source, uint32_t options) {
   try {
