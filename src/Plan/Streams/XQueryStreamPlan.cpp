@@ -20,6 +20,9 @@ namespace {
 // next sibling of it nor of its parent, then nothing follows it.
 constexpr size_t levelsThatHoldDescendants = 3;
 
+// What the reader can look for.
+constexpr size_t mostSteps = 63;
+
 struct FoldOfFunction {
   std::string_view name;
   XQueryStreamFold fold;
@@ -90,6 +93,8 @@ class Analysis {
     if (isa<XQueryFunctionCall>(exprAt(place))) return takeCall(place);
     if (takePosition(place)) return;
     if (const auto* quantifier = dyn_cast<XQueryQuantifiedExpr>(exprAt(place))) {
+      // Where a clause has no items the next one stands in its place: that is asked of all records.
+      if (quantifier->items().size() > 1) refuse(place, "the quantifier has more than one clause");
       _plan.fold = quantifier->every() ? XQueryStreamFold::Every : XQueryStreamFold::Some;
       return takeClauses(place);
     }
@@ -180,6 +185,7 @@ class Analysis {
       refuse(clause, "the first clause does not go through a path");
     }
     takePath(inside(bound));
+    if (_bindsRecords && levelOfRecord() <= levelsThatHoldDescendants) _recordClause = clause;
     while ((clause = _program.nextPart(clause)) != XQueryNoPlace) checkInside(clause);
   }
 
@@ -200,10 +206,64 @@ class Analysis {
       if (_facts[each].does(XQueryDeeds::ReadsRoot)) {
         refuse(shown, "it reads the document apart from the record");
       }
-      if (_facts[each].does(XQueryDeeds::ReadsOutside)) {
+      if (_facts[each].does(XQueryDeeds::ReadsOutside) && !leavesItToItsParts(each)) {
         refuse(shown, "it may lead out of the record");
       }
     }
+  }
+
+  // Whether what looks outside there are parts of the place alone, which are asked by themselves.
+  bool leavesItToItsParts(XQueryPlaceID place) const {
+    const XQueryExpr* expr = exprAt(place);
+    if (const auto* call = dyn_cast<XQueryFunctionCall>(expr)) {
+      if (!call->builtIn() || call->builtIn()->row().has(XQueryBuiltInFunction::LooksAround)) {
+        return false;
+      }
+    } else if (isa<XQueryPathExpr>(expr)) {
+      return takesInnerAxes(place);
+    }
+    for (XQueryPlaceID part = _program.firstPart(place); part != XQueryNoPlace;
+         part = _program.nextPart(part)) {
+      if (_facts[part].does(XQueryDeeds::ReadsOutside)) return true;
+    }
+    return false;
+  }
+
+  // Whether the steps stay inside of the node that the path begins with. The descendant axis does
+  // where it is that of the record itself, not of what is inside.
+  bool takesInnerAxes(XQueryPlaceID path) const {
+    const XQueryStep* step = cast<XQueryPathExpr>(exprAt(path))->step();
+    const XQueryPlaceID first = _program.firstPart(path);
+    bool isRecord = first != XQueryNoPlace && step->kind() == Kind::FilterStep &&
+                    isa<XQueryVariable>(exprAt(first)) && _recordClause != XQueryNoPlace &&
+                    _program[first].binder == _recordClause;
+    for (; step; step = step->next()) {
+      const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
+      if (!axisStep) {
+        isRecord = isRecord && step == cast<XQueryPathExpr>(exprAt(path))->step();
+        continue;
+      }
+      const bool skipsLevels = axisStep->axis() == XQueryAxisDescendantOrSelf &&
+                               asksForAnyNode(axisStep->expr()) && step->predicates().empty() &&
+                               isChildByName(step->next());
+      const bool isDescent = skipsLevels || (axisStep->axis() == XQueryAxisDescendant &&
+                                             asksForElements(axisStep->expr()));
+      if (isDescent ? !isRecord : !staysInside(axisStep->axis())) return false;
+      isRecord = false;
+    }
+    return true;
+  }
+
+  static bool staysInside(int axis) {
+    return axis == XQueryAxisChild || axis == XQueryAxisAttribute || axis == XQueryAxisSelf;
+  }
+  static bool asksForElements(const XQueryExpr* test) {
+    const auto* name = dyn_cast<XQueryNameTest>(test);
+    return (name && !name->attribute()) || asksForAnyElement(test);
+  }
+  static bool isChildByName(const XQueryStep* step) {
+    const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
+    return axisStep && axisStep->axis() == XQueryAxisChild && asksForElements(axisStep->expr());
   }
 
   // --- the path --------------------------------------------------------------------------------
@@ -222,7 +282,17 @@ class Analysis {
     const bool isWhole =
         _plan.record.size() < 2 && (_plan.record.empty() || !_plan.record.front().isAnywhere);
     if (isWhole) refuse(place, "the whole document would be one record");
+    if (_plan.record.size() > mostSteps) refuse(place, "the path to the record is too long");
+    _bindsRecords = !step;
     for (; step; step = step->next()) takeInnerStep(*step, place);
+  }
+
+  // Beyond any that matters where it is not known.
+  size_t levelOfRecord() const {
+    for (const XQueryStreamStep& step : _plan.record) {
+      if (step.isAnywhere) return SIZE_MAX;
+    }
+    return _plan.record.size();
   }
 
   // Whether more steps may belong to the way to the record. Moves on behind the step.
@@ -238,8 +308,9 @@ class Analysis {
     }
     const bool isDescendant = axisStep->axis() == XQueryAxisDescendant;
     const auto* name = dyn_cast<XQueryNameTest>(test);
-    const bool isElement = (name && !name->attribute()) || asksForAnyElement(test);
-    if ((axisStep->axis() != XQueryAxisChild && !isDescendant) || !isElement) return false;
+    if ((axisStep->axis() != XQueryAxisChild && !isDescendant) || !asksForElements(test)) {
+      return false;
+    }
     if (countsPositions(step)) {
       if (isDescendant || _isAnywhere) refuse(path, "positions are counted below any element");
       return false;
@@ -254,9 +325,7 @@ class Analysis {
   }
 
   void beginAnywhere(XQueryPlaceID path) {
-    bool isAnywhere = _isAnywhere;
-    for (const XQueryStreamStep& step : _plan.record) isAnywhere = isAnywhere || step.isAnywhere;
-    if (isAnywhere || _plan.record.size() > levelsThatHoldDescendants) {
+    if (_isAnywhere || levelOfRecord() > levelsThatHoldDescendants) {
       refuse(path, "the descendant axis may lead out of its node");
     }
     _isAnywhere = true;
@@ -290,11 +359,16 @@ class Analysis {
   void takeInnerStep(const XQueryStep& step, XQueryPlaceID path) {
     const auto* axisStep = dyn_cast<XQueryAxisStep>(&step);
     if (axisStep) {
-      const int axis = axisStep->axis();
-      if (axis != XQueryAxisChild && axis != XQueryAxisAttribute && axis != XQueryAxisSelf) {
-        refuse(path, "a step may lead out of the record");
-      }
+      if (!staysInside(axisStep->axis())) refuse(path, "a step may lead out of the record");
     } else if (step.expr()) {
+      if (_facts[_part].does(XQueryDeeds::ReadsPosition | XQueryDeeds::ReadsSize)) {
+        refuse(path, "a step counts what the one before it finds in all records");
+      }
+      // Of a whole path the same value is handed out once, as truth values are, and new nodes are
+      // sorted.
+      const bool findsNodes =
+          _facts[_part].are(XQueryItems::Node) && _facts[_part].tree == XQueryTreeFact::OfContext;
+      if (!findsNodes) refuse(path, "a step answers what may be no node of the record");
       checkStaysInside(_part);
     }
     if (step.expr()) _part = _program.nextPart(_part);
@@ -307,6 +381,8 @@ class Analysis {
   XQueryPlaceID _part = XQueryNoPlace;  // of the path, the next of those of the step at hand
   bool _isAnywhere = false;             // "//" has been met and waits for the name behind it
   bool _isComplete = false;
+  bool _bindsRecords = false;                   // the path finds the records themselves
+  XQueryPlaceID _recordClause = XQueryNoPlace;  // whose variable is a record that holds descendants
 };
 
 }  // namespace

@@ -15,7 +15,9 @@
 //
 // The descendant axis ends where the next sibling of its node or of that one's parent begins, and
 // with the document where there is neither: from deep inside of a record it may lead out of it. So
-// it may only stand at the beginning of the path, not more than three levels down.
+// it may only stand at the beginning of the path, and behind the variable of a record, not more
+// than three levels down: from there nothing follows but what is behind the document element, which
+// no name of an element finds.
 #pragma once
 
 #include "Plan/FactsAnalysis.h"

@@ -50,7 +50,7 @@ TEST(StreamPlan, TheRecordIsWhatTheNamesOfThePathFind) {
       {"/a/descendant::b", "items /a//b"},
       {"//item[price > 10]/name", "items //item"},
       {"/a/b/c[d[2] = 1]", "items /a/b/c"},
-      {"/a/b/string(c)", "items /a/b"},
+      {"/a/b/(c, d)[1]/e", "items /a/b"},
   };
   for (const Row& row : rows) EXPECT_EQ(shownPlan(row.query), row.plan) << row.query;
 }
@@ -63,6 +63,11 @@ TEST(StreamPlan, ClausesAndFoldsStandAroundAPath) {
       {"for $p in /a/b return <x>{ $p/c }</x>", "items /a/b"},
       {"declare function local:f($x) { $x/c }; for $p in /a/b return local:f($p)", "items /a/b"},
       {"declare variable $g := 1; /a/b[c = $g]", "items /a/b"},
+      {"for $b in /a/b return $b//c", "items /a/b"},
+      {"for $b in /a/b where exists($b//c[d = 1]) return <r>{ $b/descendant::c/d }</r>",
+       "items /a/b"},
+      {"for $b in /a/b/c[d] return count($b//e)", "items /a/b/c"},
+      {"some $b in /a/b satisfies $b//c = 1", "some /a/b"},
       {"count(/a/b)", "count /a/b"},
       {"sum(/a/b/c)", "sum /a/b/c"},
       {"avg(for $b in /a/b return $b/c * 2)", "avg /a/b"},
@@ -72,13 +77,20 @@ TEST(StreamPlan, ClausesAndFoldsStandAroundAPath) {
       {"empty(//b)", "empty //b"},
       {"distinct-values(/a/b/c)", "distinct /a/b/c"},
       {"some $b in /a/b satisfies $b/c = 1", "some /a/b"},
-      {"every $b in /a/b, $c in $b/c satisfies $c = 1", "every /a/b"},
+      {"every $b in /a/b satisfies (every $c in $b/c satisfies $c = 1)", "every /a/b"},
       {"(/a/b)[3]", "part 3-3 /a/b"},
       {"(for $b in /a/b return $b/c)[1]", "part 1-1 /a/b"},
       {"subsequence(/a/b, 3)", "part 3- /a/b"},
       {"subsequence(/a/b, 3, 2)", "part 3-4 /a/b"},
   };
   for (const Row& row : rows) EXPECT_EQ(shownPlan(row.query), row.plan) << row.query;
+}
+
+TEST(StreamPlan, PathsAreAsLongAsTheReaderCanLookFor) {
+  std::string path;
+  for (int i = 0; i < 63; ++i) path += "/a";
+  EXPECT_EQ(shownPlan(path), "items " + path);
+  EXPECT_EQ(shownPlan(path + "/a"), "refused 1: the path to the record is too long");
 }
 
 TEST(StreamPlan, ARefusalNamesItsPlaceAndReason) {
@@ -93,6 +105,14 @@ TEST(StreamPlan, ARefusalNamesItsPlaceAndReason) {
       {"/a/b//c/d//e", "refused 1: the descendant axis may lead out of its node"},
       {"/a/b/c/d//e", "refused 1: the descendant axis may lead out of its node"},
       {"/a/b[c]//d", "refused 1: a step may lead out of the record"},
+      {"/a/b/string(c)", "refused 1: a step answers what may be no node of the record"},
+      {"/a/b/<c/>", "refused 1: a step answers what may be no node of the record"},
+      {"declare variable $g := doc('urn:d'); /a/b/$g",
+       "refused 1: a step answers what may be no node of the record"},
+      {"/a/b[c]/string(position())",
+       "refused 1: a step counts what the one before it finds in all records"},
+      {"/a/b[c]/(c[last()], last())",
+       "refused 1: a step counts what the one before it finds in all records"},
       {"/a/b[following-sibling::b]", "refused 1: it may lead out of the record"},
       {"/a/b[c = /a/d]", "refused 1: it reads the document apart from the record"},
       {"for $b in /a/b\nreturn\n$b/..", "refused 3: it may lead out of the record"},
@@ -107,9 +127,20 @@ TEST(StreamPlan, ARefusalNamesItsPlaceAndReason) {
       {"/a/b[$g]", "refused 1: the whole document would be one record"},
       {"for $b in /a/b return ($b, .)", "refused 1: it reads the document apart from the record"},
       {"for $b in /a/b return root($b)", "refused 1: it may lead out of the record"},
-      {"for $b in /a/b return $b//c", "refused 1: it may lead out of the record"},
+      {"for $b in /a/b/c/d return $b//e", "refused 1: it may lead out of the record"},
+      {"for $b in //b return $b//c", "refused 1: it may lead out of the record"},
+      {"for $b in /a/b return $b//node()", "refused 1: it may lead out of the record"},
+      {"for $b in /a/b return $b/c//d", "refused 1: it may lead out of the record"},
+      {"for $b in /a/b return $b//c//d", "refused 1: it may lead out of the record"},
+      {"for $b in /a/b/c/@d return $b//c", "refused 1: it may lead out of the record"},
+      {"for $b in /a/b, $c in $b/c return $c//d", "refused 1: it may lead out of the record"},
+      {"for $b in /a/b return root($b//c)", "refused 1: it may lead out of the record"},
+      {"for $b in /a/b return $b//c/..", "refused 1: it may lead out of the record"},
+      {"for $b in /a/b return $b//c[../d]", "refused 1: it may lead out of the record"},
       {"some $b in /a/b satisfies $b is (/a/b)[1]",
        "refused 1: it reads the document apart from the record"},
+      {"every $b in /a/b, $c in $b/c satisfies $c = 1",
+       "refused 1: the quantifier has more than one clause"},
       {"count((/a/b, /a/c))", "refused 1: no path goes through the document record by record"},
       {"count(/a/b) + 1", "refused 1: no path goes through the document record by record"},
       {"/a/b/.[../c]", "refused 1: it may lead out of the record"},
