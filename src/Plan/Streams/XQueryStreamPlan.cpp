@@ -247,7 +247,7 @@ class Analysis {
                                asksForAnyNode(axisStep->expr()) && step->predicates().empty() &&
                                isChildByName(step->next());
       const bool isDescent = skipsLevels || (axisStep->axis() == XQueryAxisDescendant &&
-                                             asksForElements(axisStep->expr()));
+                                             asksForName(axisStep->expr()));
       if (isDescent ? !isRecord : !staysInside(axisStep->axis())) return false;
       isRecord = false;
     }
@@ -257,13 +257,13 @@ class Analysis {
   static bool staysInside(int axis) {
     return axis == XQueryAxisChild || axis == XQueryAxisAttribute || axis == XQueryAxisSelf;
   }
-  static bool asksForElements(const XQueryExpr* test) {
+  static bool asksForName(const XQueryExpr* test) {
     const auto* name = dyn_cast<XQueryNameTest>(test);
-    return (name && !name->attribute()) || asksForAnyElement(test);
+    return name && !name->attribute();
   }
   static bool isChildByName(const XQueryStep* step) {
     const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
-    return axisStep && axisStep->axis() == XQueryAxisChild && asksForElements(axisStep->expr());
+    return axisStep && axisStep->axis() == XQueryAxisChild && asksForName(axisStep->expr());
   }
 
   // --- the path --------------------------------------------------------------------------------
@@ -282,6 +282,8 @@ class Analysis {
     const bool isWhole =
         _plan.record.size() < 2 && (_plan.record.empty() || !_plan.record.front().isAnywhere);
     if (isWhole) refuse(place, "the whole document would be one record");
+    // What has nothing below it is no matter where the path goes on.
+    if (!_plan.record.back().name) refuse(place, "a record would be any element or instruction");
     if (_plan.record.size() > mostSteps) refuse(place, "the path to the record is too long");
     _bindsRecords = !step;
     for (; step; step = step->next()) takeInnerStep(*step, place);
@@ -308,9 +310,8 @@ class Analysis {
     }
     const bool isDescendant = axisStep->axis() == XQueryAxisDescendant;
     const auto* name = dyn_cast<XQueryNameTest>(test);
-    if ((axisStep->axis() != XQueryAxisChild && !isDescendant) || !asksForElements(test)) {
-      return false;
-    }
+    const bool isOfElements = asksForName(test) || asksForAnyElement(test);
+    if ((axisStep->axis() != XQueryAxisChild && !isDescendant) || !isOfElements) return false;
     if (countsPositions(step)) {
       if (isDescendant || _isAnywhere) refuse(path, "positions are counted below any element");
       return false;
