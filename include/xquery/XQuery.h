@@ -16,6 +16,7 @@
 #include "xquery/String.h"
 
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <memory>
 #include <string>
@@ -26,6 +27,8 @@ namespace xquery {
 class XQueryInternal;
 class XQueryContextInternal;
 class XQueryContext;
+struct XQueryStreamFailure;
+struct XQueryStreamInput;
 
 // Lexical variable name (UTF-8, prefix:local, without the dollar sign) to value: an item, an
 // NSArray of items, or the NSNull. The prefix is resolved in the query's prolog; no prefix means no
@@ -40,6 +43,8 @@ enum class XQueryWay : uint8_t {
   Planned,  // unless the environment variable XQUERY_PLAN is "0" when the query is compiled
   Plain,
   Explained,  // planned whatever the environment says, and the plan can be looked at
+  Streamed,   // planned, to be evaluated record by record; where that cannot be done the query has
+              // the compile error 0 "cannot be evaluated as a stream: " and the reason
 };
 
 enum class XQueryPlanFormat : uint8_t {
@@ -193,6 +198,34 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
                                             const Value& contextItem,
                                             Ref<XQueryError>* error = nullptr);
 
+  // Hears each item of the result of a stream, as soon as it is known; false ends the stream.
+  // Called on the evaluating thread; evaluating against the same context from here is not allowed.
+  using StreamReceiver = std::function<bool(const Value& item)>;
+  // Evaluates a query that was compiled to be streamed, with the document as its context item, and
+  // takes no more memory than the largest record does, however long the document is; values to be
+  // told apart by distinct-values, and what the query keeps itself, apart. The items are those that
+  // evaluateXQuery answers for the whole document, in their order. The limits are those of the
+  // whole stream. The context item of an earlier evaluation stays in force for later ones.
+  //
+  // A record is gone when the next one is read: nodes that come from the document live during the
+  // call alone. A host that still holds one of them, or a text of one, when the call returns ends
+  // the stream with error 0 "a node of a stream is still referred to"; what it holds stays good.
+  //
+  //   auto query = XQuery::xqueryWithSource("/log/entry[@level = 'error']/text", XQueryLoading(),
+  //                                         XQueryLimits(), XQueryWay::Streamed);
+  //   XQueryStreamInput input{.path = "log.xml"};
+  //   XQueryStreamFailure failure;
+  //   const bool isComplete = context->evaluateStream(*query, {}, input, [&](const Value& item) {
+  //     return write(XQueryItemStringValue(*item));
+  //   }, failure);
+  //
+  // True when the document has been read to its end, or as far as it was of use: what decides or
+  // completes the result ends the reading, and so does the receiver. False with `failure`
+  // otherwise; items before the failure have been handed out. `failure` is made empty first.
+  [[nodiscard]] bool evaluateStream(const XQuery& query, const XQueryConstants& constants,
+                                    const XQueryStreamInput& input, const StreamReceiver& receive,
+                                    XQueryStreamFailure& failure);
+
   // The context shares the client with the host; null takes it away.
   void contextSetClient(std::shared_ptr<XQueryClient> client);
   std::shared_ptr<XQueryClient> contextClient() const;
@@ -221,7 +254,10 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  Value evaluateModule(const XQueryInternal& compiled, const XQueryConstants& constants);
+  void beginEvaluation(const XQueryInternal& compiled);
+  void endEvaluation();
+  Value evaluateModule(const XQueryInternal& compiled, const XQueryConstants& constants,
+                       const std::function<Value()>& body);
   Ref<NSArray> shapedResult(const Value& result, Ref<XQueryError>* error);
   std::unique_ptr<XQueryContextInternal> _private;
 };

@@ -11,6 +11,7 @@
 #include "xquery/Number.h"
 #include "xquery/Object.h"
 #include "xquery/Serializing.h"
+#include "xquery/Stream.h"
 #include "xquery/String.h"
 #include "xquery/URL.h"
 #include "xquery/XMLNode.h"

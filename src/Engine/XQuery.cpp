@@ -4,6 +4,7 @@
 #include "Context/LimitWatch.h"
 #include "Context/XQueryContextInternal.h"
 #include "Context/XQueryGlobals.h"
+#include "Engine/BaseURIDecoration.h"
 #include "Engine/XQueryInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Report.h"
@@ -194,12 +195,8 @@ void XQueryContext::_traceValue(const Value& value, const Ref<NSString>& forLabe
   }
 }
 
-namespace {
-
-// Marks the first result with the base URI that its construction recorded. What was there before
-// the evaluation stays as it is.
-void decorateWithBaseURI(const NSArray& items, XQueryContextInternal& context) {
-  NSObject* first = items.objectAtIndex(0);
+void XQueryDecorateWithBaseURI(NSObject* first, XQueryContextInternal& context) {
+  if (context.baseURINodeCount() == 0) return;
   if (const auto* document = dyn_cast<NSXMLDocument>(first)) first = document->rootElement();
   auto* element = dyn_cast<NSXMLElement>(first);
   if (!element || !NSXMLTree::isNew(element)) return;
@@ -211,6 +208,8 @@ void decorateWithBaseURI(const NSArray& items, XQueryContextInternal& context) {
       NSXMLNode::attributeWithName(name, URI ? URI->view() : NSStringView(),
                                    NSStringView::ascii("http://www.w3.org/XML/1998/namespace")));
 }
+
+namespace {
 
 // Other errors leave the variables and the focus as they were when they arose. A limit may have
 // been reached because of what those hold.
@@ -227,24 +226,31 @@ void dropValues(XQueryContextInternal& context, const Value& formerContextItem,
 Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryConstants& constants,
                                            const Value& contextItem, Ref<XQueryError>* error) {
   const XQueryInternal& compiled = query._internal();
-  auto& context = *_private;
   if (error) *error = nullptr;
   if (compiled.isError()) return shapedResult(query.parseErrors(), error);
 
   const NSXMLEra era;
-  context._clearGlobals();
-  context.clearKept();
-  context.forgetManyFailures();
-  context.askForDiagnostics();
-  if (contextItem && !isNull(contextItem)) context.setContextItem(contextItem, 1);
-  XQueryProlog& prolog = *compiled.prolog();
-  context.setOrdered(prolog.ordered());
-  context.setActiveProlog(&prolog);
-  const Value result = evaluateModule(compiled, constants);
-  context._clearGlobals();
-  context.clearKept();
-  context.forgetManyFailures();
+  beginEvaluation(compiled);
+  if (contextItem && !isNull(contextItem)) _private->setContextItem(contextItem, 1);
+  const Value result = evaluateModule(compiled, constants, [&] {
+    return compiled.body() ? compiled.body()->evaluateWithContext(*this) : Value();
+  });
+  endEvaluation();
   return shapedResult(result, error);
+}
+
+void XQueryContext::beginEvaluation(const XQueryInternal& compiled) {
+  endEvaluation();
+  _private->askForDiagnostics();
+  XQueryProlog& prolog = *compiled.prolog();
+  _private->setOrdered(prolog.ordered());
+  _private->setActiveProlog(&prolog);
+}
+
+void XQueryContext::endEvaluation() {
+  _private->_clearGlobals();
+  _private->clearKept();
+  _private->forgetManyFailures();
 }
 
 namespace {
@@ -267,9 +273,10 @@ void takeCredit(const Value& contextItem, const XQueryConstants& constants) {
 
 }  // namespace
 
-// The value of the body, or the error that ended the evaluation.
+// What the body answers, or the error that ended the evaluation.
 Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
-                                    const XQueryConstants& constants) {
+                                    const XQueryConstants& constants,
+                                    const std::function<Value()>& body) {
   XQueryLimitWatch watch(*this);
   const Value contextItem = _private->contextItem();
   const NSXMLCredit credit;
@@ -280,7 +287,7 @@ Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
     watch.lookAtWork();
     XQuerySetConstants(constants, *compiled.prolog(), *this);
     XQueryEvaluateDeclarations(*compiled.prolog(), *this);
-    Value result = compiled.body() ? compiled.body()->evaluateWithContext(*this) : Value();
+    Value result = body();
     if (XQueryHasFailed(result, *this)) _private->throwFailure();
     // Nor is a result of more than it may take handed out because it was made in a few steps.
     watch.lookAtWork();
@@ -309,7 +316,7 @@ Ref<NSArray> XQueryContext::shapedResult(const Value& result, Ref<XQueryError>* 
     return {};
   }
   if (items->count() == 1 && isNull(items->objects().front())) return NSArray::array();
-  if (_private->baseURINodeCount() > 0) decorateWithBaseURI(*items, *_private);
+  XQueryDecorateWithBaseURI(items->objectAtIndex(0), *_private);
   return items;
 }
 

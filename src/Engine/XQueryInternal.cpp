@@ -34,13 +34,21 @@ XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource, const XQuery
 }
 
 void XQueryInternal::plan(XQueryWay way) {
-  if (way == XQueryWay::Explained) {
+  if (way == XQueryWay::Streamed) {
+    planStream();
+  } else if (way == XQueryWay::Explained) {
     auto report = std::make_unique<XQueryPlanReport>();
     _body = XQueryPlanned(*_prolog, _body, *report);
     _planReport = std::move(report);
   } else if (way == XQueryWay::Planned && XQueryPlanIsEnabled()) {
     _body = XQueryPlanned(*_prolog, _body);
   }
+}
+
+void XQueryInternal::planStream() {
+  Ref<XQueryError> refusal;
+  _streamProgram = XQueryStreamProgram::of(*_prolog, _body, refusal);
+  if (refusal) _errors.push_back(std::move(refusal));
 }
 
 XQueryInternal::XQueryInternal(Ref<XQueryError> error) : _errors{std::move(error)} {}

@@ -1,6 +1,7 @@
 // A compiled query: prolog, body and the errors found while compiling.
 #pragma once
 
+#include "Engine/Streams/XQueryStreamProgram.h"
 #include "Expr/XQueryExpr.h"
 #include "xquery/Error.h"
 #include "xquery/Loading.h"
@@ -32,14 +33,18 @@ class XQueryInternal {
   bool isError() const { return !_errors.empty(); }
   // Of a query that was compiled to be explained, and without errors; else null.
   const XQueryPlanReport* planReport() const { return _planReport.get(); }
+  // Of a query that was compiled to be streamed, and without errors; else null.
+  const XQueryStreamProgram* streamProgram() const { return _streamProgram.get(); }
 
  private:
   void plan(XQueryWay way);
+  void planStream();
 
   Ref<XQueryProlog> _prolog;
   Ref<XQueryExpr> _body;
   std::vector<Ref<XQueryError>> _errors;
   std::unique_ptr<const XQueryPlanReport> _planReport;
+  std::unique_ptr<const XQueryStreamProgram> _streamProgram;
 };
 
 }  // namespace xquery

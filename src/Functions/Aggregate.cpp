@@ -182,7 +182,10 @@ Value fn_avg(const Value* arguments, size_t count, XQueryContext& context) {
   if (count != 1) return Value();
   const size_t items = XQueryItemList(arguments[0].get()).count();
   if (items == 0) return NSNull::null();
-  Value sum = sumOf(arguments[0], context);
+  return XQueryAverageOf(sumOf(arguments[0], context), items, context);
+}
+
+Value XQueryAverageOf(Value sum, size_t items, XQueryContext& context) {
   if (!sum || items == 1 || isNaN(sum)) return sum;
   return XQueryOperatorExpr::evaluateOperator(
       XQueryOperatorDiv, sum, XQueryNumber::integerWithInt64(static_cast<int64_t>(items)), context);

@@ -17,6 +17,9 @@ Value fn_avg(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_max(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_min(const Value* arguments, size_t count, XQueryContext& context);
 
+// The average of so many items, whose sum that is.
+Value XQueryAverageOf(Value sum, size_t items, XQueryContext& context);
+
 // The answers for one item or more without shortcuts: they are the definition.
 Value XQuerySumPlainly(const Value& sequence, XQueryContext& context);
 // `comparison` is the value comparison by which an item takes the place of the best one so far.

@@ -182,6 +182,12 @@ Value XQueryFunctionCall::callBuiltIn(Value* arguments, size_t count,
   }
   // An argument without a value, as "." is without a focus, is none that a function could use.
   if (!isComplete) return failInvalidArguments(context);
+  return callBuiltInWith(arguments, count, context);
+}
+
+Value XQueryFunctionCall::callBuiltInWith(const Value* arguments, size_t count,
+                                          XQueryContext& context) const {
+  auto& dynamic = context._internal();
   const CalleeFrame calleeFrame(dynamic, nullptr);
   Value result = normalised(_function(arguments, count, context));
   if (!result) return failInvalidArguments(context);

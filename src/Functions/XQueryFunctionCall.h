@@ -49,6 +49,10 @@ class XQueryFunctionCall : public XQueryExpr {
   // after an error, which not being answered is as well.
   bool askBody(const std::function<bool(const XQueryExpr& body)>& ask,
                XQueryContext& context) const;
+  // Of a built-in function: what it answers for arguments that have been evaluated, without errors.
+  Value callBuiltInWith(const Value* arguments, size_t count, XQueryContext& context) const;
+  // Error 17, for whoever works out what a built-in function would.
+  [[gnu::noinline, gnu::cold]] Value failInvalidArguments(XQueryContext& context) const;
   // Of a declared function: what a part of its body comes to in this call, where it reads these
   // parameters and no other local variable. The other arguments are not evaluated.
   Value evaluatePartOfBody(const XQueryExpr& part, std::span<const size_t> parameters,
@@ -72,7 +76,6 @@ class XQueryFunctionCall : public XQueryExpr {
   Value callBuiltIn(Value* arguments, size_t count, XQueryContext& context) const;
   // Out of line: what they need of the stack is no part of a recursion's frames.
   [[gnu::noinline, gnu::cold]] Value failUndefined(XQueryContext& context) const;
-  [[gnu::noinline, gnu::cold]] Value failInvalidArguments(XQueryContext& context) const;
 
   Ref<NSString> _name;
   Ref<XQueryArgs> _args;

@@ -59,6 +59,11 @@ inline constexpr XQueryErrorText<> memoryCeilingReached{0, "limit: memory ceilin
 inline constexpr XQueryErrorText<> tooManyDigits{0, "limit: number of too many digits"};
 inline constexpr XQueryErrorText<> rangeTooLong{0, "limit: range of too many items"};
 
+// --- streams -------------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<1> notAStream{0, "cannot be evaluated as a stream: %@"};
+inline constexpr XQueryErrorText<> nodeOfAStreamKept{0, "a node of a stream is still referred to"};
+
 // --- parsing -------------------------------------------------------------------------------------
 
 inline constexpr XQueryErrorText<> noSource{3, "there is no query text"};

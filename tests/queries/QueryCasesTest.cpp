@@ -1,5 +1,5 @@
-// Runs the whole-query cases under tests/queries/cases, each of them plain and planned. A file
-// holds any number of cases:
+// Runs the whole-query cases under tests/queries/cases, each of them plain and planned, and record
+// by record where that can be done. A file holds any number of cases:
 //
 //   == what the case shows
 //   -- var n=5                      (optional, repeatable: an untyped atomic external variable)
@@ -30,6 +30,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -176,8 +177,11 @@ class QueryCase : public testing::Test {
   explicit QueryCase(const Place& place) : _case(readCase(place)) {}
 
   void TestBody() override {
-    for (const XQueryWay way : {XQueryWay::Plain, XQueryWay::Planned}) {
-      SCOPED_TRACE(way == XQueryWay::Plain ? "plain" : "planned");
+    const std::pair<XQueryWay, const char*> ways[] = {{XQueryWay::Plain, "plain"},
+                                                      {XQueryWay::Planned, "planned"},
+                                                      {XQueryWay::Streamed, "streamed"}};
+    for (const auto& [way, name] : ways) {
+      SCOPED_TRACE(name);
       run(way);
     }
   }
@@ -201,7 +205,15 @@ class QueryCase : public testing::Test {
         XQueryLimits(), way);
     const auto context = XQueryContext::xqueryContextWithNamespaces(_case.namespaces);
     Ref<XQueryError> error;
-    const auto items = context->evaluateXQuery(*query, _case.constants, document, &error);
+    std::vector<std::string> lines;
+    if (way == XQueryWay::Streamed) {
+      if (!canBeStreamed(*query) || !stream(*query, *context, lines, error)) return;
+    } else {
+      const auto items = context->evaluateXQuery(*query, _case.constants, document, &error);
+      for (size_t i = 0; items && i < items->count(); ++i) {
+        lines.push_back(printed(*items->objectAtIndex(i)));
+      }
+    }
     if (!_case.error.empty()) {
       ASSERT_TRUE(error) << _case.file << ":" << _case.line << " expected an error";
       const bool withLine = _case.error.find(" line ") != std::string::npos;
@@ -211,12 +223,36 @@ class QueryCase : public testing::Test {
       return;
     }
     ASSERT_FALSE(error) << _case.file << ":" << _case.line << " " << error->description()->utf8();
-    std::vector<std::string> lines;
-    if (items) {
-      for (const Value& item : items->objects())
-        lines.push_back(replaced(printed(*item), URL, place));
-    }
+    for (std::string& line : lines) line = replaced(line, URL, place);
     EXPECT_EQ(lines, _case.result) << _case.file << ":" << _case.line;
+  }
+
+  bool canBeStreamed(const XQuery& query) const {
+    const auto errors = query.parseErrors();
+    return !_case.xml.empty() &&
+           !(errors && cast<XQueryError>(errors->objects().front())->err() == 0);
+  }
+
+  // False where the document is none that is read so.
+  bool stream(const XQuery& query, XQueryContext& context, std::vector<std::string>& lines,
+              Ref<XQueryError>& error) const {
+    XQueryStreamInput input;
+    input.options = NSXMLNodePreserveWhitespace;
+    input.read = [left = std::string_view(_case.xml)](char* buffer, size_t size) mutable {
+      const size_t count = left.copy(buffer, std::min(size, size_t{7}));
+      left.remove_prefix(count);
+      return static_cast<ptrdiff_t>(count);
+    };
+    XQueryStreamFailure failure;
+    const bool isComplete = context.evaluateStream(
+        query, _case.constants, input,
+        [&](const Value& item) {
+          lines.push_back(printed(*item));
+          return true;
+        },
+        failure);
+    error = failure.error;
+    return isComplete || error;
   }
 
   Case _case;

@@ -47,17 +47,18 @@ Ref<NSURL> NSURL::fileURLWithPath(std::string_view path) {
   return make<NSURL>(NSString::stringWithASCII("file://" + escapedPath(absolute)));
 }
 
+// URLs are kept in caches: they have a text of their own, not one that keeps a document alive.
 Ref<NSURL> NSURL::URLWithString(const Ref<NSString>& text) {
   // Every character of a URI is ASCII.
   if (!text || text->view().isWide() || !isURIReference(textOf(*text))) return nullptr;
-  return make<NSURL>(text);
+  return make<NSURL>(NSString::stringWithView(text->view()));
 }
 
 Ref<NSURL> NSURL::URLWithString(const Ref<NSString>& text, const NSURL& base) {
   if (!text || text->view().isWide()) return nullptr;
   const std::optional<URIText> resolved = resolveURIReference(textOf(*text), textOf(*base._text));
   if (!resolved) return nullptr;
-  return make<NSURL>(NSString::stringWithASCII(*resolved), text);
+  return make<NSURL>(NSString::stringWithASCII(*resolved), NSString::stringWithView(text->view()));
 }
 
 std::string NSURL::scheme() const {

@@ -1,17 +1,14 @@
 // The doors through which documents come in.
 #include "Platform/Base/CountedBytes.h"
+#include "Platform/Reading/InputFile.h"
 #include "Platform/Reading/Tidy.h"
 #include "Platform/Reading/UnpackedInput.h"
 #include "Platform/Reading/XMLDocuments.h"
 #include "Platform/Reading/XMLReader.h"
 
-#include <cerrno>
 #include <cstring>
-#include <fcntl.h>
 #include <limits>
 #include <optional>
-#include <sys/stat.h>
-#include <unistd.h>
 #include <vector>
 
 namespace xquery {
@@ -55,50 +52,6 @@ Ref<NSXMLDocument> readUnpacked(UnpackedInput& input, uint32_t options, NSXMLPar
   error = {input.failure(), 0, 0};
   return nullptr;
 }
-
-// An open file, closed at the end unless it is standard input.
-class InputFile {
- public:
-  explicit InputFile(const std::string& path)
-      : _descriptor(path == "-" ? STDIN_FILENO : ::open(path.c_str(), O_RDONLY | O_CLOEXEC)) {}
-  ~InputFile() {
-    if (_descriptor > STDIN_FILENO) ::close(_descriptor);
-  }
-  InputFile(const InputFile&) = delete;
-  InputFile& operator=(const InputFile&) = delete;
-
-  bool isOpen() const { return _descriptor >= 0; }
-  ptrdiff_t read(char* buffer, size_t size, const NSXMLReadingProgress& progress) {
-    ptrdiff_t count = 0;
-    do {
-      count = ::read(_descriptor, buffer, size);
-    } while (count < 0 && errno == EINTR);
-    if (count < 0) _failure = errno;
-    if (count > 0) _bytesRead += static_cast<uint64_t>(count);
-    if (count > 0 && progress) progress(_bytesRead, bytesInFile());
-    return count;
-  }
-  // 0 for what has none.
-  uint64_t bytesInFile() const {
-    struct stat about;
-    const bool isFile = ::fstat(_descriptor, &about) == 0 && S_ISREG(about.st_mode);
-    return isFile ? static_cast<uint64_t>(about.st_size) : 0;
-  }
-  int failure() const { return _failure; }
-  // Whether it has a beginning to go back to, as files have and pipes have not.
-  bool isSeekable() const { return ::lseek(_descriptor, 0, SEEK_CUR) == 0; }
-  bool rewind() {
-    const bool isThere = ::lseek(_descriptor, 0, SEEK_SET) == 0;
-    if (!isThere) _failure = errno;
-    _bytesRead = 0;
-    return isThere;
-  }
-
- private:
-  int _descriptor;
-  int _failure = 0;
-  uint64_t _bytesRead = 0;
-};
 
 Ref<NSXMLDocument> unreadable(const std::string& path, const std::string& failure,
                               NSXMLParseError& error) {
@@ -148,7 +101,7 @@ Ref<NSXMLDocument> NSXMLDocument::documentWithFile(const std::string& path, uint
   NSXMLParseError ignored;
   NSXMLParseError& reported = error ? *error : ignored;
   InputFile file(path);
-  if (!file.isOpen()) return unreadable(path, std::strerror(errno), reported);
+  if (!file.isOpen()) return unreadable(path, std::strerror(file.failure()), reported);
   UnpackedInput input([&](char* buffer, size_t size) { return file.read(buffer, size, progress); },
                       file.isSeekable() ? [&] { return file.rewind(); } : TextRewinding());
   Ref<NSXMLDocument> document = readUnpacked(input, options, reported);

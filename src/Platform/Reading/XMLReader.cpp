@@ -47,6 +47,8 @@ class XMLReader {
   NSXMLDocument* beginRecords(std::span<const XMLRecordStep> path);
   // Null at the end of the document.
   const NSXMLElement* readRecord();
+  // Of what is to be read next.
+  TextPlace place() const;
   // The tree is its owner's.
   void letGoOfTree() { static_cast<void>(_tree.finish()); }
 
@@ -127,11 +129,13 @@ class XMLReader {
   std::vector<Level, ValueAllocator<Level>> _levels;
   std::span<const XMLRecordStep> _path;
   size_t _recordDepth = 0;  // of the record that is being read; 0 outside
+  TextPlace _windowPlace;   // where the text in hand begins; not known for a whole document
 };
 
 // --- the whole -------------------------------------------------------------------------------
 
 bool XMLReader::getMore() {
+  if (!_levels.empty()) _windowPlace = place();
   const bool isMore = _source.more(_at);
   _at = _source.begin();
   _end = _source.end();
@@ -200,6 +204,12 @@ const NSXMLElement* XMLReader::closedRecord() {
   _recordDepth = 0;
   _tree.endOpenNodes();
   return cast<NSXMLElement>(_tree.current()->firstChild());
+}
+
+TextPlace XMLReader::place() const {
+  TextPlace place = _windowPlace;
+  place.pass({_source.begin(), static_cast<size_t>(_at - _source.begin())});
+  return place;
 }
 
 // After a piece outside of records. The record, if it was a whole one. Whatever was before it below
@@ -578,6 +588,7 @@ class XMLRecords::Reading {
     return record;
   }
   bool isAtEnd() const { return _isAtEnd; }
+  TextPlace place() const { return _reader.place(); }
   NSXMLDocument* document() const { return _document.get(); }
 
  private:
@@ -587,6 +598,14 @@ class XMLRecords::Reading {
   bool _isOver = false;
   bool _isAtEnd = false;
 };
+
+void TextPlace::pass(std::string_view text) {
+  const auto count = std::count(text.begin(), text.end(), '\n');
+  const size_t last = text.rfind('\n');
+  line += count;
+  column = last == text.npos ? column + static_cast<int64_t>(text.size())
+                             : static_cast<int64_t>(text.size() - last);
+}
 
 XMLRecords::XMLRecords(TextSource& source, std::span<const XMLRecordStep> path, uint32_t options)
     : _reading(std::make_unique<Reading>(source, path, options)) {}
@@ -599,6 +618,14 @@ const NSXMLElement* XMLRecords::next() {
 
 bool XMLRecords::isAtEnd() const {
   return _reading->isAtEnd();
+}
+
+TextPlace XMLRecords::place() const {
+  return _reading->place();
+}
+
+uint32_t XMLRecords::references() const {
+  return __atomic_load_n(&NSXMLTree::of(document())->references, __ATOMIC_RELAXED);
 }
 
 NSXMLDocument* XMLRecords::document() const {

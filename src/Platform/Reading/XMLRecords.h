@@ -11,6 +11,7 @@
 #include <cstdint>
 #include <memory>
 #include <span>
+#include <string_view>
 #include <vector>
 
 namespace xquery {
@@ -22,6 +23,14 @@ struct XMLRecordStep {
   const NSXMLExpandedName* name = nullptr;  // null for any
 };
 constexpr size_t mostRecordSteps = 63;
+
+// Counted from 1; columns in bytes.
+struct TextPlace {
+  int64_t line = 1;
+  int64_t column = 1;
+
+  void pass(std::string_view text);
+};
 
 class XMLRecords {
  public:
@@ -37,8 +46,14 @@ class XMLRecords {
   const NSXMLElement* next();
   // Whether all of the document has been read.
   bool isAtEnd() const;
+  // After the last record, where not all has been read: where the piece of the document begins that
+  // our reader does not take.
+  TextPlace place() const;
   // Above the records; the same all the time.
   NSXMLDocument* document() const;
+  // How many references to the document, its nodes and their texts there are, this object's
+  // included. To be compared with what it was before a record was looked at.
+  uint32_t references() const;
 
  private:
   class Reading;

@@ -1,0 +1,207 @@
+// Evaluating record by record.
+//
+//   XMLRecords             makes the next record, in the memory of the one before
+//     XQueryStreamProgram  what is evaluated for it, with its document as the context item
+//       XQueryStreamFolding  puts the values together, and emits what is known of the result
+//         receiver         the host
+//
+// Before the next record is made nobody may refer to the one before. What the engine itself keeps
+// between two evaluations of an expression is dropped here: the frame of local variables, kept
+// values, the focus where an error left it. What the folding keeps is apart from the document. So
+// whatever is counted then beyond the references of the driver is held by the host, which ends the
+// stream: its nodes must stay what they are.
+//
+// Everything happens within one evaluation: declarations are evaluated once, limits count from its
+// beginning, and of the items made only the first is marked with its base URI.
+#include "Context/LimitWatch.h"
+#include "Context/XQueryContextInternal.h"
+#include "Engine/BaseURIDecoration.h"
+#include "Engine/Streams/XQueryStreamFolding.h"
+#include "Engine/XQueryInternal.h"
+#include "Expr/XQuerySequence.h"
+#include "Platform/Base/HostFailure.h"
+#include "Platform/Reading/InputFile.h"
+#include "Platform/Reading/UnpackedInput.h"
+#include "Platform/Reading/XMLRecords.h"
+#include "Platform/Tree/Arena.h"
+#include "Types/XQueryErrors.h"
+#include "xquery/Stream.h"
+
+#include <cstring>
+#include <optional>
+#include <utility>
+
+namespace xquery {
+
+namespace {
+
+constexpr const char* notRead =
+    "from here on the document is not well formed, or written in a way that streams do not read: "
+    "in another encoding than UTF-8, or with a document type that declares something";
+
+bool cannotGoBack() {
+  return false;
+}
+
+// The names of the way to the records, as the context resolves them.
+class RecordPath {
+ public:
+  RecordPath(const XQueryStreamProgram& program, XQueryContext& context) {
+    for (const XQueryStreamProgram::Step& step : program.record) {
+      _steps.push_back({step.isAnywhere, step.name ? nameOf(*step.name, context) : nullptr});
+    }
+  }
+  std::span<const XMLRecordStep> steps() const { return _steps; }
+
+ private:
+  const NSXMLExpandedName* nameOf(const XQueryNameTest& test, XQueryContext& context) {
+    if (const NSXMLExpandedName* bound = test.boundName()) return bound;
+    const Ref<XQueryQName> name = test.qNameForContext(&context);
+    if (name) _names.push_back(XQueryNameTest::interned(*name));
+    // The name of nothing, where no node can have it.
+    if (!name || !_names.back().get()) _names.emplace_back(NSStringView(), NSStringView());
+    return _names.back().get();
+  }
+
+  std::vector<XMLRecordStep> _steps;
+  std::vector<NSXMLExpandedNameRef> _names;  // that the steps refer to
+};
+
+// Puts the focus back, and drops the variables, which may hold nodes of the last record.
+class FormerFocus {
+ public:
+  explicit FormerFocus(XQueryContextInternal& context)
+      : _context(context), _item(context.contextItem()), _position(context.position()) {}
+  ~FormerFocus() {
+    _context.setContextItem(_item, _position);
+    _context._setInScopeVariables(nullptr);
+  }
+  FormerFocus(const FormerFocus&) = delete;
+  FormerFocus& operator=(const FormerFocus&) = delete;
+
+ private:
+  XQueryContextInternal& _context;
+  const Value _item;
+  const int64_t _position;
+};
+
+class Stream {
+ public:
+  Stream(const XQueryStreamProgram& program, XQueryContext& context, const XQueryStreamInput& input,
+         const XQueryContext::StreamReceiver& receive, XQueryStreamFailure& failure)
+      : _program(program),
+        _context(context),
+        _internal(context._internal()),
+        _input(input),
+        _receive(receive),
+        _failure(failure) {}
+
+  // The value, but for items that have been handed out; null after a failure. What fails within the
+  // evaluation is the context's.
+  Value run() {
+    if (_input.read) return runOver(_input.read);
+    InputFile file(_input.path);
+    if (!file.isOpen()) return fail(std::strerror(file.failure()));
+    const auto read = [&](char* buffer, size_t size) {
+      return file.read(buffer, size, _input.progress);
+    };
+    Value result = runOver(read);
+    return file.failure() && !_isDecided ? fail(std::strerror(file.failure())) : result;
+  }
+
+ private:
+  Value fail(const std::string& message, TextPlace place = {0, 0}) {
+    _failure.reading = {message, place.line, place.column};
+    return {};
+  }
+
+  Value runOver(const TextInput& read) {
+    UnpackedInput unpacked(read, cannotGoBack);
+    TextSource source(unpacked.input(), cannotGoBack);
+    const RecordPath path(_program, _context);
+    XMLRecords records(source, path.steps(), _input.options);
+    const FormerFocus former(_internal);
+    XQueryStreamFolding folding(_program, _context,
+                                [this](const Value& item) { return emit(item); });
+    if (!evaluateAll(records, folding)) return {};
+    if (!_isDecided && !unpacked.failure().empty()) return fail(unpacked.failure());
+    if (!_isDecided && !records.isAtEnd()) return fail(notRead, records.place());
+    return _firstError ? _firstError : folding.result();
+  }
+
+  // False after an error.
+  bool evaluateAll(XMLRecords& records, XQueryStreamFolding& folding) {
+    _internal._setInScopeVariables(nullptr);
+    _internal.setContextItem(records.document(), 1);
+    const uint32_t references = records.references();
+    while (!_isDecided && records.next()) {
+      if (!evaluateRecord(folding)) return false;
+      _internal._setInScopeVariables(nullptr);
+      _internal.clearKept();
+      _internal.setContextItem(records.document(), 1);
+      if (!_isDecided && records.references() != references) {
+        _internal.raise(XQueryErrors::nodeOfAStreamKept.error());
+      }
+    }
+    return true;
+  }
+
+  bool evaluateRecord(XQueryStreamFolding& folding) {
+    const Value value = _program.each->evaluateWithContext(_context);
+    if (XQueryHasFailed(value, _context)) return false;
+    _isDecided = value && !folding.add(value);
+    return !_internal.isFailing();
+  }
+
+  bool emit(const Value& item) {
+    const bool isFirst = !std::exchange(_hasEmitted, true);
+    if (isFirst && isa<XQueryError>(item.get())) {
+      _firstError = item;
+      return false;
+    }
+    if (isFirst) XQueryDecorateWithBaseURI(item.get(), _internal);
+    return passingOnHostFailures([&] { return _receive(item); });
+  }
+
+  const XQueryStreamProgram& _program;
+  XQueryContext& _context;
+  XQueryContextInternal& _internal;
+  const XQueryStreamInput& _input;
+  const XQueryContext::StreamReceiver& _receive;
+  XQueryStreamFailure& _failure;
+  bool _hasEmitted = false;
+  bool _isDecided = false;  // before the end of the document
+  Value _firstError;        // which is the error of the whole
+};
+
+}  // namespace
+
+bool XQueryContext::evaluateStream(const XQuery& query, const XQueryConstants& constants,
+                                   const XQueryStreamInput& input, const StreamReceiver& receive,
+                                   XQueryStreamFailure& failure) {
+  failure = {};
+  const XQueryInternal& compiled = query._internal();
+  if (compiled.isError()) {
+    failure.error = compiled.errors().front();
+    return false;
+  }
+  const XQueryStreamProgram* program = compiled.streamProgram();
+  if (!program) {
+    failure.error = XQueryErrors::notAStream.error("it was not compiled to be");
+    return false;
+  }
+  const NSXMLEra era;
+  beginEvaluation(compiled);
+  Stream stream(*program, *this, input, receive, failure);
+  const Value result = evaluateModule(compiled, constants, [&] { return stream.run(); });
+  endEvaluation();
+  const Ref<NSArray> items = shapedResult(result, &failure.error);
+  if (failure.error) failure.reading = {};
+  if (!items || failure.error) return false;
+  for (const Value& item : items->objects()) {
+    if (!receive(item)) break;
+  }
+  return true;
+}
+
+}  // namespace xquery

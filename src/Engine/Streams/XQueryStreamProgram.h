@@ -1,0 +1,40 @@
+// A query as it is evaluated record by record: how to find the records, what to evaluate for each,
+// and what to make of that.
+#pragma once
+
+#include "Expr/Paths/XQueryNameTest.h"
+#include "Functions/XQueryFunctionCall.h"
+#include "Plan/Streams/XQueryStreamPlan.h"
+#include "xquery/Error.h"
+
+#include <cstdint>
+#include <memory>
+#include <vector>
+
+namespace xquery {
+
+class XQueryProlog;
+
+struct XQueryStreamProgram {
+  struct Step {
+    bool isAnywhere;           // below, not a child
+    Ref<XQueryNameTest> name;  // null for any element
+  };
+
+  std::vector<Step> record;
+  XQueryStreamFold fold = XQueryStreamFold::Items;
+  // Of a part: the positions of its items.
+  uint64_t first = 1;
+  uint64_t last = 0;
+  // Evaluated with the document that holds the record as the context item. Planned.
+  Ref<XQueryExpr> each;
+  // Whose argument that is; null for a fold without a function.
+  Ref<XQueryFunctionCall> call;
+
+  // Of a query that has been bound. Null, with the refusal, for one that cannot be evaluated so.
+  [[nodiscard]] static std::unique_ptr<const XQueryStreamProgram> of(const XQueryProlog& prolog,
+                                                                     const Ref<XQueryExpr>& body,
+                                                                     Ref<XQueryError>& refusal);
+};
+
+}  // namespace xquery

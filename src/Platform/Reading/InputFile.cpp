@@ -1,0 +1,47 @@
+#include "Platform/Reading/InputFile.h"
+
+#include <cerrno>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace xquery {
+
+InputFile::InputFile(const std::string& path)
+    : _descriptor(path == "-" ? STDIN_FILENO : ::open(path.c_str(), O_RDONLY | O_CLOEXEC)) {
+  if (!isOpen()) _failure = errno;
+}
+
+InputFile::~InputFile() {
+  if (_descriptor > STDIN_FILENO) ::close(_descriptor);
+}
+
+ptrdiff_t InputFile::read(char* buffer, size_t size, const NSXMLReadingProgress& progress) {
+  ptrdiff_t count = 0;
+  do {
+    count = ::read(_descriptor, buffer, size);
+  } while (count < 0 && errno == EINTR);
+  if (count < 0) _failure = errno;
+  if (count > 0) _bytesRead += static_cast<uint64_t>(count);
+  if (count > 0 && progress) progress(_bytesRead, bytesInFile());
+  return count;
+}
+
+uint64_t InputFile::bytesInFile() const {
+  struct stat about;
+  const bool isFile = ::fstat(_descriptor, &about) == 0 && S_ISREG(about.st_mode);
+  return isFile ? static_cast<uint64_t>(about.st_size) : 0;
+}
+
+bool InputFile::isSeekable() const {
+  return ::lseek(_descriptor, 0, SEEK_CUR) == 0;
+}
+
+bool InputFile::rewind() {
+  const bool isThere = ::lseek(_descriptor, 0, SEEK_SET) == 0;
+  if (!isThere) _failure = errno;
+  _bytesRead = 0;
+  return isThere;
+}
+
+}  // namespace xquery

@@ -1,0 +1,353 @@
+// Evaluating record by record, compared with evaluating over the whole document.
+#include "Engine/LimitsTestSupport.h"
+#include "xquery/xquery.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+std::string shownItem(const NSObject& item) {
+  std::string text = XQueryItemTypeName(item) + ":";
+  if (const auto* node = dyn_cast<NSXMLNode>(&item)) return text + node->XMLString()->utf8();
+  return text + XQueryItemStringValue(item);
+}
+
+XQueryStreamInput inputOf(std::string_view text, size_t pieces = 5) {
+  XQueryStreamInput input;
+  input.options = NSXMLNodePreserveWhitespace;
+  input.read = [text, pieces](char* buffer, size_t size) mutable {
+    const size_t count = text.copy(buffer, std::min(size, pieces));
+    text.remove_prefix(count);
+    return static_cast<ptrdiff_t>(count);
+  };
+  return input;
+}
+
+Ref<XQuery> compiled(std::string_view query, XQueryWay way = XQueryWay::Streamed) {
+  auto result = XQuery::xqueryWithSource(query, XQueryLoading(), XQueryLimits(), way);
+  const auto errors = result->parseErrors();
+  EXPECT_FALSE(errors) << query << "\n  "
+                       << cast<XQueryError>(errors->objects().front())->description()->utf8();
+  return result;
+}
+
+struct Answer {
+  std::vector<std::string> items;
+  std::string error;
+};
+
+Answer streamed(XQueryContext& context, std::string_view query, const XQueryStreamInput& input,
+                const XQueryConstants& constants = {}) {
+  Answer answer;
+  XQueryStreamFailure failure;
+  const bool isComplete = context.evaluateStream(
+      *compiled(query), constants, input,
+      [&](const Value& item) {
+        answer.items.push_back(shownItem(*item));
+        return true;
+      },
+      failure);
+  EXPECT_EQ(isComplete, !failure.error && failure.reading.message.empty());
+  if (failure.error) answer.error = failure.error->description()->utf8();
+  if (!failure.reading.message.empty()) {
+    answer.error = "document " + std::to_string(failure.reading.line) + ":" +
+                   std::to_string(failure.reading.column);
+  }
+  return answer;
+}
+
+Answer streamed(std::string_view query, std::string_view text) {
+  return streamed(*XQueryContext::xqueryContext(), query, inputOf(text));
+}
+
+Answer ofTheWhole(std::string_view query, std::string_view text,
+                  const Ref<XQueryContext>& context = XQueryContext::xqueryContext()) {
+  Answer answer;
+  const auto document = NSXMLDocument::documentWithData(text, NSXMLNodePreserveWhitespace);
+  Ref<XQueryError> error;
+  const auto items =
+      context->evaluateXQuery(*compiled(query, XQueryWay::Plain), {}, document, &error);
+  for (size_t i = 0; items && i < items->count(); ++i) {
+    answer.items.push_back(shownItem(*items->objectAtIndex(i)));
+  }
+  if (error) answer.error = error->description()->utf8();
+  return answer;
+}
+
+const std::string documents[] = {
+    "<a/>",
+    "<a><b><c>1</c></b></a>",
+    "<a x='1'><b i='1'><c>3</c><c>1</c></b>\n<b i='2'/><!--0--><b i='3'><c>2</c><d>t</d></b></a>",
+    "<a><b><c>2.5</c></b><b><c>x</c></b><b><c>1</c></b></a>",
+    "<a><b><c>NaN</c></b><b><c>1</c></b><b><c>INF</c></b></a>",
+    "<a><b i='a'><c>a text of more than a few characters</c></b><b i='a'><c>a text of more than a "
+    "few characters</c></b><b i='b'><c>another text, as long as the one before</c></b></a>",
+    "<a xmlns='u' xmlns:p='v'><b><c p:i='1'>1</c></b></a>",
+    "<a xmlns:p='v'><b><p:c p:i='1'>1</p:c><c>7</c></b><b><b><c>8</c></b></b></a>",
+};
+
+constexpr std::string_view queries[] = {
+    "/a/b",
+    "/a/b/c",
+    "a/b/@i",
+    "//c",
+    "//b",
+    "/a/b[c = 1]",
+    "/a/b[@i > 1]/c/text()",
+    "/a/b/c[1]",
+    "/a/b/c[last()]",
+    "for $b in /a/b return string($b/c[1])",
+    "/a/b/(c)[1]",
+    "/a/b/(c, d)[2]/text()",
+    "/a/b/(c[last()])",
+    "declare namespace p = 'v'; //p:c/@p:i",
+    "declare default element namespace 'u'; /a/b/c",
+    "for $b in /a/b where $b//c > 1 return <r i='{ $b/@i }'>{ $b/descendant::c }</r>",
+    "for $b in /a/b return <r i='{ $b/@i }'>{ $b/c, count($b/c) }</r>",
+    "for $b in /a/b, $c in $b/c let $n := number($c) return $n * 2",
+    "for $b in /a/b return for $c in $b/c order by string($c) return $c",
+    "declare base-uri 'urn:base'; for $b in /a/b return <r>{ $b/c }</r>",
+    "declare function local:f($x) { $x/c, $x/d }; for $b in /a/b return local:f($b)",
+    "declare variable $g := 1; /a/b[c = $g]/c",
+    "count(/a/b)",
+    "count(//c)",
+    "sum(/a/b/c)",
+    "sum(for $c in /a/b/c return xs:decimal($c))",
+    "sum(for $c in /a/b/c return xs:byte($c))",
+    "sum(for $b in /a/b return string($b/c[1]))",
+    "avg(/a/b/c)",
+    "avg(for $c in /a/b/c return xs:decimal($c))",
+    "avg(for $b in /a/b return string($b/c[1]))",
+    "min(/a/b/c)",
+    "min(for $b in /a/b return string($b/c[1]))",
+    "max(/a/b/c)",
+    "max(for $b in /a/b return string($b/c[1]))",
+    "max(for $c in /a/b/c return xs:date('2000-01-01'))",
+    "exists(/a/b/c)",
+    "exists(/a/b/d)",
+    "empty(/a/b/c)",
+    "distinct-values(/a/b/c)",
+    "distinct-values(for $b in /a/b return string($b/c[1]))",
+    "distinct-values(for $b in /a/b, $c in $b/* return node-name($c))",
+    "distinct-values(for $c in /a/b/c return string-length($c))",
+    "some $c in /a/b/c satisfies $c = 1",
+    "every $c in /a/b/c satisfies $c = 1",
+    "some $c in /a/b/c satisfies xs:integer($c) = 1",
+    "(/a/b)[2]",
+    "(/a/b/c)[1]",
+    "subsequence(/a/b/c, 2)",
+    "subsequence(/a/b/c, 2, 2)",
+    "subsequence(/a/b/c, 2, 0)",
+};
+
+TEST(Stream, AnswersWhatTheWholeDocumentWould) {
+  for (const std::string& text : documents) {
+    for (const std::string_view query : queries) {
+      const Answer whole = ofTheWhole(query, text);
+      const Answer answer = streamed(query, text);
+      EXPECT_EQ(answer.error, whole.error) << query << "\n" << text;
+      if (!whole.error.empty()) continue;
+      EXPECT_EQ(answer.items, whole.items) << query << "\n" << text;
+    }
+  }
+}
+
+TEST(Stream, ResolvesNamesInItsContext) {
+  const std::string text = "<a xmlns='u'><b>1</b><b>2</b></a>";
+  const auto with = [] { return XQueryContext::xqueryContextWithNamespaces({{"", "u"}}); };
+  const Answer answer = streamed(*with(), "/a/b/text()", inputOf(text));
+  EXPECT_EQ(answer.items, ofTheWhole("/a/b/text()", text, with()).items);
+  EXPECT_EQ(answer.items.size(), 2U);
+  EXPECT_TRUE(streamed("/a/b", text).items.empty());
+}
+
+TEST(Stream, IsGivenConstants) {
+  const Answer answer =
+      streamed(*XQueryContext::xqueryContext(), "declare variable $n external; /a/b[c = $n]/@i",
+               inputOf(documents[2]), {{"n", XQueryUntypedAtomic("2")}});
+  EXPECT_EQ(answer.items, std::vector<std::string>{"attribute():i=\"3\""});
+}
+
+TEST(Stream, KeepsTheContextItemThatWasInForce) {
+  const auto context = XQueryContext::xqueryContext();
+  const auto document = NSXMLDocument::documentWithData("<z/>", 0);
+  const auto query = compiled("name(*)", XQueryWay::Plain);
+  ASSERT_TRUE(context->evaluateXQuery(*query, {}, document));
+  for (const std::string_view each : {"/a/b", "/a/b[xs:date(c)]"}) {
+    static_cast<void>(streamed(*context, each, inputOf(documents[2])));
+    const auto items = context->evaluateXQuery(*query, {}, nullptr);
+    ASSERT_TRUE(items);
+    EXPECT_EQ(shownItem(*items->objectAtIndex(0)), "xs:string:z");
+  }
+}
+
+// So many records; counts the bytes.
+XQueryStreamInput records(size_t& bytes, size_t number = SIZE_MAX,
+                          const std::string& record = "<b><c>1</c></b>\n") {
+  XQueryStreamInput input;
+  input.read = [&bytes, number, record, left = std::string("<a>")](char* buffer,
+                                                                   size_t size) mutable {
+    while (left.size() < size && number > 0) left += --number == 0 ? record + "</a>" : record;
+    const size_t count = left.copy(buffer, size);
+    left.erase(0, count);
+    bytes += count;
+    return static_cast<ptrdiff_t>(count);
+  };
+  return input;
+}
+
+TEST(Stream, EndsWhereNothingMoreMatters) {
+  for (const std::string_view query :
+       {"exists(/a/b)", "empty(/a/b)", "some $b in /a/b satisfies $b/c = 1",
+        "every $b in /a/b satisfies $b/c = 2", "(/a/b/c)[3]", "subsequence(/a/b, 2, 2)"}) {
+    size_t bytes = 0;
+    const Answer answer = streamed(*XQueryContext::xqueryContext(), query, records(bytes));
+    EXPECT_EQ(answer.error, "") << query;
+    EXPECT_FALSE(answer.items.empty()) << query;
+    EXPECT_LT(bytes, size_t{1} << 20) << query;
+  }
+}
+
+TEST(Stream, EndsWhenTheReceiverHasEnough) {
+  size_t bytes = 0;
+  int count = 0;
+  XQueryStreamFailure failure;
+  EXPECT_TRUE(XQueryContext::xqueryContext()->evaluateStream(
+      *compiled("/a/b/c"), {}, records(bytes), [&](const Value&) { return ++count < 3; }, failure));
+  EXPECT_EQ(count, 3);
+}
+
+TEST(Stream, TakesNoMoreMemoryHoweverLongItIs) {
+  XQueryLimits limits;
+  limits.memoryCeiling = 1 << 20;
+  for (const std::string_view query :
+       {"/a/b[c = 2]", "count(//c)", "sum(/a/b/c)", "max(for $b in /a/b return string($b/c))",
+        "distinct-values(/a/b/c)", "every $b in /a/b satisfies $b/c = 1",
+        "count(for $b in /a/b return <r>{ $b/c }</r>)"}) {
+    const auto context = XQueryContext::xqueryContext();
+    context->contextSetLimits(limits);
+    size_t bytes = 0;
+    EXPECT_EQ(streamed(*context, query, records(bytes, 15'000)).error, "") << query;
+    EXPECT_GT(bytes, size_t{3} << 16);
+  }
+}
+
+TEST(Stream, EndsAtItsLimits) {
+  const auto context = XQueryContext::xqueryContext();
+  XQueryLimits limits;
+  limits.memoryCeiling = 1 << 20;
+  context->contextSetLimits(limits);
+  size_t bytes = 0;
+  const std::string large = "<b>" + std::string(8 << 20, 'x') + "</b>";
+  EXPECT_EQ(streamed(*context, "/a/b", records(bytes, SIZE_MAX, large)).error,
+            "XQueryError:0 - \"limit: memory ceiling reached\"");
+  limits = {};
+  limits.duration = std::chrono::milliseconds(50);
+  context->contextSetLimits(limits);
+  EXPECT_EQ(streamed(*context, "count(/a/b)", records(bytes)).error,
+            "XQueryError:0 - \"limit: deadline passed\"");
+}
+
+TEST(Stream, HandsOutWhatComesBeforeAFailure) {
+  const Answer error =
+      streamed("for $b in /a/b return xs:integer($b/c)", "<a><b><c>1</c></b><b><c>x</c></b></a>");
+  EXPECT_EQ(error.items, std::vector<std::string>{"xs:integer:1"});
+  EXPECT_NE(error.error, "");
+  const Answer malformed =
+      streamed("for $b in /a/b return xs:integer($b/c)", "<a>\n<b><c>1</c></b>\n <b><c></b></a>");
+  EXPECT_EQ(malformed.items, std::vector<std::string>{"xs:integer:1"});
+  EXPECT_EQ(malformed.error, "document 3:8");
+  EXPECT_EQ(streamed("count(/a/b)", "<a><b/>").error, "document 1:8");
+  EXPECT_EQ(streamed("count(/a/b)", "").error, "document 1:1");
+}
+
+TEST(Stream, DoesNotReadWhatDeclaresSomething) {
+  EXPECT_EQ(streamed("/a/b", "<!DOCTYPE a [<!ENTITY e '1'>]><a><b>&e;</b></a>").error,
+            "document 1:1");
+}
+
+TEST(Stream, EndsWhereTheHostKeepsANode) {
+  const auto context = XQueryContext::xqueryContext();
+  std::vector<Value> kept;
+  XQueryStreamFailure failure;
+  EXPECT_FALSE(context->evaluateStream(
+      *compiled("/a/b"), {}, inputOf(documents[2]),
+      [&](const Value& item) {
+        kept.push_back(item);
+        return true;
+      },
+      failure));
+  ASSERT_TRUE(failure.error);
+  EXPECT_EQ(failure.error->msg()->utf8(), "a node of a stream is still referred to");
+  ASSERT_EQ(kept.size(), 1U);
+  EXPECT_EQ(shownItem(*kept.front()), "element():<b i=\"1\"><c>3</c><c>1</c></b>");
+}
+
+TEST(Stream, KeepsNothingOfARecordItself) {
+  const std::string text =
+      "<a><b>urn:a-text-of-more-than-a-few-characters-1</b><b>urn:a-text-of-more-than-a-few-"
+      "characters-2</b></a>";
+  for (const std::string_view query :
+       {"for $b in /a/b return doc-available($b)", "for $b in /a/b return matches('a', $b)",
+        "for $b in /a/b return xs:anyURI($b)",
+        "distinct-values(for $b in /a/b return xs:anyURI($b))",
+        "max(for $b in /a/b return xs:anyURI($b))", "for $b in /a/b return QName(string($b), 'x')",
+        "distinct-values(for $b in /a/b return QName(string($b), 'x'))",
+        "for $b in /a/b return element { QName(string($b), 'x') } {}",
+        "for $b in /a/b return <r xml:base='{ $b }'/>",
+        "distinct-values(for $b in /a/b return xs:token($b))",
+        "min(for $b in /a/b return xs:token($b))"}) {
+    const Answer whole = ofTheWhole(query, text);
+    const Answer answer = streamed(query, text);
+    EXPECT_EQ(answer.error, whole.error) << query;
+    if (!whole.error.empty()) continue;
+    EXPECT_EQ(answer.items, whole.items) << query;
+  }
+}
+
+TEST(Stream, PassesOnWhatTheReceiverThrows) {
+  const auto context = XQueryContext::xqueryContext();
+  XQueryStreamFailure failure;
+  const auto receive = [](const Value&) -> bool { throw std::length_error("the host's own"); };
+  EXPECT_THROW(static_cast<void>(context->evaluateStream(*compiled("/a/b"), {},
+                                                         inputOf(documents[2]), receive, failure)),
+               std::length_error);
+}
+
+TEST(Stream, IsRefusedLikeAnErrorOfCompiling) {
+  const auto query =
+      XQuery::xqueryWithSource("1,\n/a/b[2]", XQueryLoading(), XQueryLimits(), XQueryWay::Streamed);
+  const auto errors = query->parseErrors();
+  ASSERT_TRUE(errors);
+  EXPECT_EQ(cast<XQueryError>(errors->objects().front())->description()->utf8(),
+            "XQueryError:0 - \"cannot be evaluated as a stream: no path goes through the document "
+            "record by record\" at line:1");
+  XQueryStreamFailure failure;
+  const auto receive = [](const Value&) { return true; };
+  EXPECT_FALSE(XQueryContext::xqueryContext()->evaluateStream(*query, {}, inputOf("<a/>"), receive,
+                                                              failure));
+  EXPECT_EQ(static_cast<const NSObject*>(failure.error.get()), errors->objectAtIndex(0));
+  EXPECT_FALSE(XQueryContext::xqueryContext()->evaluateStream(
+      *compiled("/a/b", XQueryWay::Planned), {}, inputOf("<a/>"), receive, failure));
+  EXPECT_EQ(failure.error->msg()->utf8(),
+            "cannot be evaluated as a stream: it was not compiled to be");
+}
+
+TEST(Stream, MayStillBeEvaluatedOverAWholeDocument) {
+  const auto document = NSXMLDocument::documentWithData(documents[2], 0);
+  const auto items =
+      XQueryContext::xqueryContext()->evaluateXQuery(*compiled("count(/a/b)"), {}, document);
+  ASSERT_TRUE(items);
+  EXPECT_EQ(shownItem(*items->objectAtIndex(0)), "xs:integer:3");
+}
+
+}  // namespace
+}  // namespace xquery
