@@ -36,19 +36,6 @@ bool showsProgress(const Options& options) {
   return !options.quiet && (options.progress || options.inputs.size() + !!options.filesFrom < 2);
 }
 
-[[noreturn]] void failReading(const std::string& path, const NSXMLParseError& error) {
-  const std::string name = inputName(path);
-  if (error.line == 0) {
-    // The reason why a file cannot be read begins with its path.
-    const size_t named = error.message.starts_with(path + ": ") ? path.size() + 2 : 0;
-    throw Failure{StatusInput, "xquery: " + name + ": " + error.message.substr(named), {}};
-  }
-  throw Failure{StatusInput,
-                name + ":" + std::to_string(error.line) + ":" + std::to_string(error.column) +
-                    ": " + error.message,
-                {}};
-}
-
 }  // namespace
 
 std::string readFile(const std::string& path) {
@@ -87,19 +74,42 @@ std::string inputName(const std::string& path) {
   return path == "-" ? "standard input" : path;
 }
 
+uint32_t readingMode(const Options& options) {
+  return options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
+}
+
+Failure readingFailure(const std::string& path, const NSXMLParseError& error) {
+  const std::string name = inputName(path);
+  if (error.line == 0) {
+    // The reason why a file cannot be read begins with its path.
+    const size_t named = error.message.starts_with(path + ": ") ? path.size() + 2 : 0;
+    return {StatusInput, "xquery: " + name + ": " + error.message.substr(named), {}};
+  }
+  return {StatusInput,
+          name + ":" + std::to_string(error.line) + ":" + std::to_string(error.column) + ": " +
+              error.message,
+          {}};
+}
+
+DocumentProgress::DocumentProgress(const Options& options, const std::string& path) {
+  if (showsProgress(options)) _line.emplace(visible(inputName(path)));
+}
+
+NSXMLReadingProgress DocumentProgress::callback() {
+  if (!_line) return {};
+  return [this](uint64_t bytes, uint64_t whole) { _line->show(bytes, whole); };
+}
+
 Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path, Markup markup) {
   NSXMLParseError error;
-  uint32_t mode = options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
+  uint32_t mode = readingMode(options);
   if (markup == Markup::HTML) mode |= NSXMLDocumentTidyHTML;
-  NSXMLReadingProgress progress;
-  std::optional<ProgressLine> line;
-  if (showsProgress(options)) {
-    line.emplace(visible(inputName(path)));
-    progress = [&line](uint64_t bytes, uint64_t whole) { line->show(bytes, whole); };
+  Ref<NSXMLDocument> document;
+  {
+    DocumentProgress progress(options, path);
+    document = NSXMLDocument::documentWithFile(path, mode, &error, progress.callback());
   }
-  const Ref<NSXMLDocument> document = NSXMLDocument::documentWithFile(path, mode, &error, progress);
-  line.reset();
-  if (!document) failReading(path, error);
+  if (!document) throw readingFailure(path, error);
   return document;
 }
 

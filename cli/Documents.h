@@ -2,8 +2,11 @@
 #pragma once
 
 #include "Options.h"
+#include "Progress.h"
 #include "xquery/xquery.h"
 
+#include <cstdint>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -28,6 +31,21 @@ enum class Markup { XML, HTML };
 // "-" is standard input. Throws Failure.
 xquery::Ref<xquery::NSXMLDocument> readDocument(const Options& options, const std::string& path,
                                                 Markup markup);
+
+// How a document is to be read, and what there is to say of one that could not be.
+uint32_t readingMode(const Options& options);
+Failure readingFailure(const std::string& path, const xquery::NSXMLParseError& error);
+
+// The line that shows how far the reading of an input is, while it exists and where one is shown.
+class DocumentProgress {
+ public:
+  DocumentProgress(const Options& options, const std::string& path);
+  // Empty where none is shown.
+  xquery::NSXMLReadingProgress callback();
+
+ private:
+  std::optional<ProgressLine> _line;
+};
 
 // How messages and results name an input.
 std::string inputName(const std::string& path);

@@ -39,7 +39,9 @@ std::vector<Ref<NSError>> list(const NSArray& errors) {
 
 Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
   const UnderWay compiling;
-  const XQueryWay way = options.plan ? XQueryWay::Explained : XQueryWay::Planned;
+  const XQueryWay way = options.stream ? XQueryWay::Streamed
+                        : options.plan ? XQueryWay::Explained
+                                       : XQueryWay::Planned;
   Ref<XQuery> query = XQuery::xqueryWithSource(source, loading(options), limits(options), way);
   const Ref<NSArray> errors = query->parseErrors();
   if (!errors || errors->count() == 0) return query;
@@ -61,6 +63,14 @@ Ref<NSArray> Evaluation::evaluate(const XQuery& query, const XQueryConstants& co
     throw Failure{StatusQueryError, description(*failure), {failure}};
   }
   return items;
+}
+
+bool Evaluation::evaluateStream(const XQuery& query, const XQueryConstants& constants,
+                                const XQueryStreamInput& input,
+                                const std::function<bool(const Value& item)>& receive,
+                                XQueryStreamFailure& failure) {
+  const UnderWay evaluating;
+  return _context->evaluateStream(query, constants, input, receive, failure);
 }
 
 // What has no such value, as several numbers have not, is a result all the same.

@@ -4,6 +4,8 @@
 #include "Options.h"
 #include "xquery/xquery.h"
 
+#include <functional>
+
 namespace cli {
 
 // Throws Failure.
@@ -19,6 +21,11 @@ class Evaluation {
   xquery::Ref<xquery::NSArray> evaluate(const xquery::XQuery& query,
                                         const xquery::XQueryConstants& constants,
                                         const xquery::Value& contextItem);
+  // As XQueryContext::evaluateStream.
+  bool evaluateStream(const xquery::XQuery& query, const xquery::XQueryConstants& constants,
+                      const xquery::XQueryStreamInput& input,
+                      const std::function<bool(const xquery::Value& item)>& receive,
+                      xquery::XQueryStreamFailure& failure);
 
  private:
   const xquery::Ref<xquery::XQueryContext> _context;

@@ -50,9 +50,13 @@ Framing framing(const Options& options) {
 
 void ItemWriter::write(const NSArray& items) {
   for (size_t i = 0; i < items.count() && !_result.isStopped(); i++) {
-    _result.beginItem();
-    writeItem(*items.objectAtIndex(i));
+    write(*items.objectAtIndex(i));
   }
+}
+
+void ItemWriter::write(const NSObject& item) {
+  _result.beginItem();
+  writeItem(item);
 }
 
 void ItemWriter::writeItem(const NSObject& item) {

@@ -22,6 +22,7 @@ class ItemWriter {
 
   // Stops at the first failed write.
   void write(const xquery::NSArray& items);
+  void write(const xquery::NSObject& item);
 
  private:
   void writeItem(const xquery::NSObject& item);

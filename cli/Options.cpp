@@ -4,6 +4,7 @@
 #include "Messages.h"
 #include "OptionsTable.h"
 #include "Output.h"
+#include "Streaming.h"
 #include "Streams.h"
 
 #include <CLI/CLI.hpp>
@@ -205,6 +206,7 @@ std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
     if (!shell.empty()) return printCompletions(shell.front());
     interpretArguments(app, options);
     checkStandardInput(options);
+    if (options.stream) checkStream(options);
     checkTogether(options);
   } catch (const CLI::Success& success) {
     return print(app, success);

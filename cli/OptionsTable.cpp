@@ -201,6 +201,10 @@ constexpr OptionRow rows[] = {
      "Work on N inputs at a time; without it, one for each processor", count<&Options::jobs, 1024>},
     {ofInput, "--strip-space", Takes::Nothing, "", Offers::Nothing,
      "Drop text of white space only from documents", set<&Options::stripSpace>},
+    {ofInput, "--stream", Takes::Nothing, "", Offers::Nothing,
+     "Evaluate INPUT record by record, in the memory of one record, and write each item as it is "
+     "found; a query for which that cannot be done is refused",
+     set<&Options::stream>},
     {ofResult, "--types", Takes::Nothing, "", Offers::Nothing,
      "Put the type and a tab before each item", set<&Options::types>},
     {ofResult, "--as", Takes::Value, "lines|xml|html|json|text", Offers::Words,

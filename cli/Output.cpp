@@ -25,12 +25,13 @@ bool Output::append(std::string_view text) {
 }
 
 bool Output::finish() {
-  if (!_error.empty() || !flush()) return false;
+  if (!flush()) return false;
   if (!_result.finish()) _error = _result.error();
   return _error.empty();
 }
 
 bool Output::flush() {
+  if (!_error.empty()) return false;
   const bool written = write(_buffer);
   _buffer.clear();
   return written;

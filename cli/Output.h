@@ -21,9 +21,10 @@ class Output {
   [[nodiscard]] bool finish();
   // The reason of the first failure, empty without one.
   const std::string& error() const { return _error; }
+  // Writes what has been gathered. False after a failed write.
+  bool flush();
 
  private:
-  bool flush();
   bool write(std::string_view text);
 
   static constexpr size_t bufferSize = 256 * 1024;

@@ -43,6 +43,11 @@ std::string Results::error() {
   return _output.error();
 }
 
+void Results::flush() {
+  const std::lock_guard lock(_mutex);
+  if (_isOpen) _output.flush();
+}
+
 Status Results::status() {
   const std::lock_guard lock(_mutex);
   return _status;

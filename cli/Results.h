@@ -35,6 +35,8 @@ class Results {
   // there is one, unless it was stopped. False when it could not be written; `error` says why.
   [[nodiscard]] bool finish(size_t parts);
   std::string error();
+  // What has been written goes to its reader; for streams, which have one part.
+  void flush();
   // The gravest that a part ended with.
   Status status();
   // No part goes on, and what was to be written to a file is not.

@@ -7,6 +7,7 @@
 #include "Output.h"
 #include "Reports.h"
 #include "Signals.h"
+#include "Streaming.h"
 #include "Streams.h"
 #include "Timing.h"
 #include "xquery/xquery.h"
@@ -34,6 +35,11 @@ Status runPhases(const Options& options) {
     return StatusResult;
   }
   const XQueryConstants constants = phases.parse.measure([&] { return bindConstants(options); });
+  if (options.stream) {
+    const Status status = runStream(options, *query, constants, phases);
+    if (options.time && (status == StatusResult || status == StatusFalse)) phases.report(false);
+    return status;
+  }
   std::optional<std::vector<Input>> inputs;
   if (options.hasInputs()) inputs = inputsOf(options);
   const Status status = runJobs(options, *query, constants, inputs, phases);

@@ -252,9 +252,10 @@ TEST(Options, VersionNamesTheCommand) {
 TEST(Options, HelpNamesEveryOption) {
   const Outcome outcome = xquery({"--help"});
   EXPECT_EQ(outcome.status, 0);
-  for (const char* option : {"QUERYFILE", "INPUT", "-e QUERY", "--types", "--var NAME=VALUE",
-                             "--doc NAME=FILE", "--namespace P=URI", "--html", "--strip-space",
-                             "-o FILE", "--time", "--repeat N", "--help", "--version"}) {
+  for (const char* option :
+       {"QUERYFILE", "INPUT", "-e QUERY", "--types", "--var NAME=VALUE", "--doc NAME=FILE",
+        "--namespace P=URI", "--html", "--strip-space", "-o FILE", "--time", "--repeat N",
+        "--stream", "--help", "--version"}) {
     EXPECT_THAT(outcome.out, HasSubstr(option));
   }
 }

@@ -1,0 +1,126 @@
+#include "Streaming.h"
+
+#include "Documents.h"
+#include "Evaluation.h"
+#include "ItemWriter.h"
+#include "Messages.h"
+#include "OptionsTable.h"
+#include "Reports.h"
+#include "Results.h"
+#include "Signals.h"
+
+#include <optional>
+#include <string>
+
+namespace cli {
+namespace {
+
+using namespace xquery;
+
+class Stream {
+ public:
+  Stream(const Options& options, const XQuery& query)
+      : _options(options),
+        _query(query),
+        _path(options.inputs.front()),
+        _results(options, framing(options), 1),
+        _part(_results, 0),
+        _writer(options, inputName(_path), _part) {}
+
+  Status run(const XQueryConstants& constants, Phases& phases);
+
+ private:
+  // None when all was read and written.
+  std::optional<Failure> evaluate(const XQueryConstants& constants);
+  bool receive(const Value& item);
+  void beginOnce();
+  Status finish(const std::optional<Failure>& failure);
+
+  const Options& _options;
+  const XQuery& _query;
+  const std::string _path;
+  Results _results;
+  ResultPart _part;
+  ItemWriter _writer;
+  Ref<NSError> _errorItem;  // ends the stream as a failure does
+  bool _hasBegun = false, _hasItems = false, _isTrue = false;
+};
+
+Status Stream::run(const XQueryConstants& constants, Phases& phases) {
+  return finish(phases.evaluate.measure([&] { return evaluate(constants); }));
+}
+
+// The line of progress is gone when it ends.
+std::optional<Failure> Stream::evaluate(const XQueryConstants& constants) {
+  Evaluation evaluation(_options);
+  DocumentProgress progress(_options, _path);
+  XQueryStreamInput input;
+  input.path = _path;
+  input.options = readingMode(_options);
+  input.progress = progress.callback();
+  XQueryStreamFailure failure;
+  const bool isWhole = evaluation.evaluateStream(
+      _query, constants, input, [this](const Value& item) { return receive(item); }, failure);
+  if (_errorItem) return Failure{StatusQueryError, description(*_errorItem), {_errorItem}};
+  if (isWhole) return std::nullopt;
+  if (failure.error) {
+    return Failure{StatusQueryError, description(*failure.error), {failure.error}};
+  }
+  // Nothing has failed where nothing more could be written.
+  if (failure.reading.message.empty()) return std::nullopt;
+  return readingFailure(_path, failure.reading);
+}
+
+bool Stream::receive(const Value& item) {
+  _errorItem = Ref<NSError>(dyn_cast<NSError>(item.get()));
+  if (_errorItem) return false;
+  if (_options.exitStatus) _isTrue = _hasItems || isTrue(NSArray::arrayWithObjects({item}).get());
+  _hasItems = true;
+  beginOnce();
+  _writer.write(*item);
+  return !_part.isStopped();
+}
+
+void Stream::beginOnce() {
+  if (!_hasBegun) _part.begin();
+  _hasBegun = true;
+}
+
+Status Stream::finish(const std::optional<Failure>& failure) {
+  if (interruption()->load()) {
+    _results.stop();
+    endIfInterrupted();
+  }
+  if (failure) {
+    _results.flush();
+    _part.end(failure->status, report(_options, *failure));
+    if (_options.outputFile) _results.stop();
+  } else {
+    beginOnce();
+    _part.end();
+  }
+  if (!_results.finish(1)) {
+    const std::string name = _options.outputFile.value_or("standard output");
+    throw Failure{StatusInput, "xquery: cannot write " + name + ": " + _results.error(), {}};
+  }
+  if (failure) return failure->status;
+  return _options.exitStatus && !_isTrue ? StatusFalse : StatusResult;
+}
+
+}  // namespace
+
+void checkStream(const Options& options) {
+  const auto refuse = [](const char* what) { throw WrongUsage("--stream " + std::string(what)); };
+  if (options.check) return;
+  if (options.plan) refuse("excludes --plan");
+  if (options.inputs.size() != 1 || options.filesFrom) refuse("requires one INPUT");
+  if (options.html) refuse("excludes --html");
+  if (options.repeat > 1) refuse("excludes --repeat");
+}
+
+Status runStream(const Options& options, const XQuery& query, const XQueryConstants& constants,
+                 Phases& phases) {
+  return Stream(options, query).run(constants, phases);
+}
+
+}  // namespace cli

@@ -1,0 +1,111 @@
+// xquery --stream.
+#include "cli/Command.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <string>
+
+using command::Outcome;
+using command::shell;
+using command::TemporaryDirectory;
+using command::xquery;
+using testing::HasSubstr;
+
+namespace {
+
+const std::string text = "<a>\n<b><c>1</c></b>\n<b><c>2</c></b>\n<d/></a>";
+
+TEST(StreamCommand, WritesWhatIsWrittenWithoutIt) {
+  const TemporaryDirectory directory;
+  const std::string file = directory.write("a.xml", text);
+  for (const std::string query :
+       {"/a/b", "count(//c)", "for $b in /a/b return <r>{ $b/c/text() }</r>", "sum(/a/b/c)"}) {
+    const std::string whole = xquery({"--types", "-e", query, file}).out;
+    EXPECT_NE(whole, "");
+    const Outcome outcome = xquery({"--stream", "--types", "-e", query, file});
+    EXPECT_EQ(outcome.out, whole);
+    EXPECT_EQ(outcome.status, 0);
+    EXPECT_EQ(xquery({"--stream", "--types", "-e", query, "-"}, text).out, whole);
+  }
+}
+
+TEST(StreamCommand, IsGivenVariablesNamespacesAndOptions) {
+  const Outcome outcome = xquery({"--stream", "--var", "n=2", "--namespace", "p=u", "-e",
+                                  "declare variable $n external; /p:a/p:b[. = $n]/text()", "-"},
+                                 "<a xmlns='u'><b>1</b><b>2</b></a>");
+  EXPECT_EQ(outcome.out, "2\n");
+  EXPECT_EQ(xquery({"--stream", "--strip-space", "-e", "count(/a/b/text())", "-"},
+                   "<a><b> </b><b>x</b></a>")
+                .out,
+            "1\n");
+}
+
+TEST(StreamCommand, RefusesBeforeAnythingIsRead) {
+  const Outcome outcome = xquery({"--stream", "-e", "\nreverse(/a/b)", "/no/such/file"});
+  EXPECT_EQ(outcome.status, 1);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_EQ(outcome.err,
+            "XQueryError:0 - \"cannot be evaluated as a stream: the function needs the whole of "
+            "its argument\" at line:2\n");
+  EXPECT_EQ(xquery({"--stream", "-e", "/a/b", "/no/such/file"}).status, 3);
+}
+
+TEST(StreamCommand, WantsAnInputAndNothingThatIsDoneTwice) {
+  EXPECT_EQ(xquery({"--stream", "-e", "/a/b"}).status, 2);
+  EXPECT_EQ(xquery({"--stream", "--html", "-e", "/a/b", "-"}).status, 2);
+  EXPECT_EQ(xquery({"--stream", "--repeat", "2", "-e", "/a/b", "-"}).status, 2);
+}
+
+TEST(StreamCommand, KeepsWhatIsWrittenWhereTheRestIsBad) {
+  const Outcome outcome = xquery({"--stream", "-e", "/a/b/c", "-"}, text.substr(0, 30) + "</a>");
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_EQ(outcome.out, "<c>1</c>\n");
+  EXPECT_THAT(outcome.err, testing::StartsWith("standard input:3:8: from here on the document"));
+  const Outcome error =
+      xquery({"--stream", "-e", "for $b in /a/b return 1 idiv (2 - xs:integer($b/c))", "-"}, text);
+  EXPECT_EQ(error.status, 1);
+  EXPECT_EQ(error.out, "1\n");
+  EXPECT_THAT(error.err, testing::StartsWith("XQueryError:"));
+}
+
+TEST(StreamCommand, ReplacesAFileByACompleteResultOnly) {
+  const TemporaryDirectory directory;
+  const std::string file = directory.write("out", "before");
+  EXPECT_EQ(xquery({"--stream", "-o", file, "-e", "/a/b/c", "-"}, "<a><b><c/></b>").status, 3);
+  EXPECT_EQ(command::readFile(file), "before");
+  EXPECT_EQ(xquery({"--stream", "-o", file, "-e", "/a/b/c", "-"}, text).status, 0);
+  EXPECT_EQ(command::readFile(file), "<c>1</c>\n<c>2</c>\n");
+}
+
+TEST(StreamCommand, EndsWithItsReader) {
+  const Outcome outcome = shell(
+      "{ printf '<a>'; yes '<b>text</b>'; } | \"$0\" --stream -e /a/b/text\\(\\) - | head -n 1");
+  EXPECT_EQ(outcome.out, "text\n");
+}
+
+TEST(StreamCommand, EndsTheReadingWhenItKnows) {
+  const Outcome outcome =
+      shell("{ printf '<a>'; yes '<b>text</b>'; } | \"$0\" --stream -e 'exists(/a/b)' -");
+  EXPECT_EQ(outcome.out, "true\n");
+}
+
+#if defined(NDEBUG) && !defined(XQUERY_SANITIZED)
+constexpr int records = 500'000;  // 200 MB
+#else
+constexpr int records = 10'000;
+#endif
+
+TEST(StreamCommand, TakesNoMoreMemoryHoweverLongTheInputIs) {
+  const std::string record = "<b i='1'><c>1</c><d>" + std::string(368, 'x') + "</d></b>";
+  const std::string input =
+      "{ echo '<a>'; yes \"$1\" | head -n " + std::to_string(records) + "; echo '</a>'; }";
+  const Outcome outcome = shell(input + " | \"$0\" --stream -e 'sum(/a/b[@i = 1]/c)' -", {record});
+  EXPECT_EQ(outcome.out, std::to_string(records) + "\n");
+#if !defined(XQUERY_SANITIZED)
+  EXPECT_LT(outcome.mostMemory, size_t{64} << 20);
+#endif
+}
+
+}  // namespace
