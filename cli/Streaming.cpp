@@ -58,6 +58,7 @@ std::optional<Failure> Stream::evaluate(const XQueryConstants& constants) {
   input.path = _path;
   input.options = readingMode(_options);
   input.progress = progress.callback();
+  input.beforeWaiting = [this] { _results.flush(); };
   XQueryStreamFailure failure;
   const bool isWhole = evaluation.evaluateStream(
       _query, constants, input, [this](const Value& item) { return receive(item); }, failure);

@@ -12,22 +12,26 @@
 
 namespace xquery {
 
-// The document: a file, or what a function of the host reads. XML in UTF-8 without declarations of
-// its own; packed by gzip, xz, zstd or bzip2 as well.
+// The document: a file, or what a function of the host reads. All XML that NSXMLDocument reads,
+// packed by gzip, xz, zstd or bzip2 as well; UTF-8 without declarations of its own is by far the
+// fastest.
 struct XQueryStreamInput {
   std::string path;  // "-" is standard input; not looked at where there is a function
   // Fills the buffer; answers the number of bytes, 0 at the end of the input, negative on failure.
-  // Called on the evaluating thread; must not throw.
+  // What it answers is looked at before it is called again, however little it is. Called on the
+  // evaluating thread; must not throw.
   std::function<ptrdiff_t(char* buffer, size_t size)> read;
   uint32_t options = 0;           // NSXMLOptions; that for HTML is not looked at
   NSXMLReadingProgress progress;  // of a file; may be empty
+  // Of a file, which may be a pipe: called where nothing can be read from it yet, before that is
+  // waited for. Time to write what has been gathered; may be empty, must not throw.
+  std::function<void()> beforeWaiting;
 };
 
 // Why a stream ended before its end: one of the two is set.
 struct XQueryStreamFailure {
   Ref<XQueryError> error;
-  // Of the document, with line 0 where it could not be read. What is well formed and yet not read
-  // as a stream, such as another encoding, is told of in the same way.
+  // Of the document: what NSXMLDocument says of it, with line 0 where it could not be read.
   NSXMLParseError reading;
 };
 

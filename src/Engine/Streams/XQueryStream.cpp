@@ -35,10 +35,6 @@ namespace xquery {
 
 namespace {
 
-constexpr const char* notRead =
-    "from here on the document is not well formed, or written in a way that streams do not read: "
-    "in another encoding than UTF-8, or with a document type that declares something";
-
 bool cannotGoBack() {
   return false;
 }
@@ -103,38 +99,44 @@ class Stream {
     InputFile file(_input.path);
     if (!file.isOpen()) return fail(std::strerror(file.failure()));
     const auto read = [&](char* buffer, size_t size) {
-      return file.read(buffer, size, _input.progress);
+      return file.read(buffer, size, _input.progress, _input.beforeWaiting);
     };
     Value result = runOver(read);
     return file.failure() && !_isDecided ? fail(std::strerror(file.failure())) : result;
   }
 
  private:
-  Value fail(const std::string& message, TextPlace place = {0, 0}) {
-    _failure.reading = {message, place.line, place.column};
+  Value fail(const std::string& message) {
+    _failure.reading = {message, 0, 0};
     return {};
   }
 
   Value runOver(const TextInput& read) {
     UnpackedInput unpacked(read, cannotGoBack);
     TextSource source(unpacked.input(), cannotGoBack);
+    source.takeAsItComes();
     const RecordPath path(_program, _context);
     XMLRecords records(source, path.steps(), _input.options);
     const FormerFocus former(_internal);
     XQueryStreamFolding folding(_program, _context,
                                 [this](const Value& item) { return emit(item); });
-    if (!evaluateAll(records, folding)) return {};
-    if (!_isDecided && !unpacked.failure().empty()) return fail(unpacked.failure());
-    if (!_isDecided && !records.isAtEnd()) return fail(notRead, records.place());
+    NSXMLParseError error;
+    const bool isWellFormed = evaluateAll(records, folding, error);
+    if (_hasFailed) return {};
+    if (!isWellFormed) {
+      if (!unpacked.failure().empty()) return fail(unpacked.failure());
+      _failure.reading = error;
+      return {};
+    }
     return _firstError ? _firstError : folding.result();
   }
 
-  // False after an error.
-  bool evaluateAll(XMLRecords& records, XQueryStreamFolding& folding) {
+  // False, with the error, where the document is not well formed.
+  bool evaluateAll(XMLRecords& records, XQueryStreamFolding& folding, NSXMLParseError& error) {
     _internal._setInScopeVariables(nullptr);
     _internal.setContextItem(records.document(), 1);
     const uint32_t references = records.references();
-    while (!_isDecided && records.next()) {
+    const auto receive = [&](const NSXMLElement&) {
       if (!evaluateRecord(folding)) return false;
       _internal._setInScopeVariables(nullptr);
       _internal.clearKept();
@@ -142,15 +144,19 @@ class Stream {
       if (!_isDecided && records.references() != references) {
         _internal.raise(XQueryErrors::nodeOfAStreamKept.error());
       }
-    }
-    return true;
+      return !_isDecided;
+    };
+    return records.read(receive, error);
   }
 
+  // False after an error.
   bool evaluateRecord(XQueryStreamFolding& folding) {
     const Value value = _program.each->evaluateWithContext(_context);
-    if (XQueryHasFailed(value, _context)) return false;
+    _hasFailed = XQueryHasFailed(value, _context);
+    if (_hasFailed) return false;
     _isDecided = value && !folding.add(value);
-    return !_internal.isFailing();
+    _hasFailed = _internal.isFailing();
+    return !_hasFailed;
   }
 
   bool emit(const Value& item) {
@@ -170,6 +176,7 @@ class Stream {
   const XQueryContext::StreamReceiver& _receive;
   XQueryStreamFailure& _failure;
   bool _hasEmitted = false;
+  bool _hasFailed = false;
   bool _isDecided = false;  // before the end of the document
   Value _firstError;        // which is the error of the whole
 };

@@ -2,6 +2,7 @@
 
 #include <cerrno>
 #include <fcntl.h>
+#include <poll.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -16,7 +17,10 @@ InputFile::~InputFile() {
   if (_descriptor > STDIN_FILENO) ::close(_descriptor);
 }
 
-ptrdiff_t InputFile::read(char* buffer, size_t size, const NSXMLReadingProgress& progress) {
+ptrdiff_t InputFile::read(char* buffer, size_t size, const NSXMLReadingProgress& progress,
+                          const std::function<void()>& beforeWaiting) {
+  pollfd input = {_descriptor, POLLIN, 0};
+  if (beforeWaiting && ::poll(&input, 1, 0) == 0) beforeWaiting();
   ptrdiff_t count = 0;
   do {
     count = ::read(_descriptor, buffer, size);

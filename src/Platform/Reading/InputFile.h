@@ -5,6 +5,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <string>
 
 namespace xquery {
@@ -18,7 +19,9 @@ class InputFile {
   InputFile& operator=(const InputFile&) = delete;
 
   bool isOpen() const { return _descriptor >= 0; }
-  ptrdiff_t read(char* buffer, size_t size, const NSXMLReadingProgress& progress);
+  // `beforeWaiting`, if there is one, is called where nothing is there yet.
+  ptrdiff_t read(char* buffer, size_t size, const NSXMLReadingProgress& progress,
+                 const std::function<void()>& beforeWaiting = {});
   // 0 for what has none.
   uint64_t bytesInFile() const;
   // The number of the system's error; 0 where nothing failed.

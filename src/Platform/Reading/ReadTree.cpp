@@ -99,6 +99,20 @@ const NSStringView* ReadTree::storedLasting(const ReadText& text) {
   return withStorable(text, Storing{_builder});
 }
 
+void ReadTree::check(const ReadText& text) {
+  if (text.isASCII) return;
+  for (std::string_view rest = text.bytes; !rest.empty();) {
+    const std::string_view part = firstPart(rest);
+    static_cast<void>(widened(part));
+    rest.remove_prefix(part.size());
+  }
+}
+
+void ReadTree::dropOpenElement() {
+  endSpaceChange();
+  _builder.dropOpenElement();
+}
+
 void ReadTree::backTo(const NSXMLTreeBuilder::Mark& mark) {
   _pending.clear();
   _pendingIsExact = false;
@@ -182,12 +196,16 @@ void ReadTree::hearSpace(const NSXMLName* name, std::string_view value) {
   _keepsWhitespace = keeps;
 }
 
-void ReadTree::closeElement() {
-  flush();
+void ReadTree::endSpaceChange() {
   if (!_spaceChanges.empty() && _spaceChanges.back().element == _builder.current()) {
     _keepsWhitespace = _spaceChanges.back().keepsOutside;
     _spaceChanges.pop_back();
   }
+}
+
+void ReadTree::closeElement() {
+  flush();
+  endSpaceChange();
   _builder.close();
 }
 

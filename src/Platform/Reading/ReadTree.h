@@ -45,6 +45,8 @@ class ReadTree {
   void addSection(std::string_view text);
   void addComment(const ReadText& text);
   void addInstruction(const NSXMLName* target, const ReadText& text);
+  // Throws for what is none at once, not when it is put into the tree.
+  void check(const ReadText& text);
   // For nodes to share.
   const NSStringView* stored(const ReadText& text);
   const NSStringView* storedLasting(const ReadText& text);
@@ -55,6 +57,8 @@ class ReadTree {
   // Text that is still pending is gone as well.
   void backTo(const NSXMLTreeBuilder::Mark& mark);
   void endOpenNodes() { _builder.endOpenNodes(); }
+  // Instead of closing it: as if it had not been there.
+  void dropOpenElement();
 
  private:
   // An element under which xml:space changes what is kept.
@@ -73,6 +77,7 @@ class ReadTree {
   auto withStorable(const ReadText& text, Add add);
   NSStringView widened(std::string_view text);
   const NSStringView* storedAlone(std::string_view text);
+  void endSpaceChange();
   void hearSpace(const NSXMLName* name, std::string_view value);
 
   bool _alwaysKeepsWhitespace;

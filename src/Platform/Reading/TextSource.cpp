@@ -83,7 +83,7 @@ bool TextSource::more(const char* keep) {
 void TextSource::fill() {
   char* at = _window + (_end - _begin);
   char* const end = _window + _windowSize;
-  while (at < end) {
+  while (at < end && !isEnough(static_cast<size_t>(at - _end))) {
     const ptrdiff_t count = _input(at, static_cast<size_t>(end - at));
     _hasFailed = count < 0;
     _isOver = count <= 0;
@@ -93,6 +93,13 @@ void TextSource::fill() {
     checkWork(1 + static_cast<size_t>(count) / bytesPerStep);
   }
   _end = at;
+}
+
+// Whether to begin again with so much more than before. A long piece grows by a part of itself.
+bool TextSource::isEnough(size_t count) const {
+  constexpr size_t shortPiece = 4096;
+  const auto before = static_cast<size_t>(_end - _begin);
+  return _takesAsItComes && count > (before < shortPiece ? 0 : before / 8);
 }
 
 // Large pieces of the input, for a reader of small ones.
@@ -114,6 +121,14 @@ ptrdiff_t TextSource::readAgain(char* buffer, size_t size) {
   if (const size_t count = _kept.read(buffer, size)) return static_cast<ptrdiff_t>(count);
   if (_hasFailed) return -1;
   return _isOver ? 0 : readPieces(buffer, size);
+}
+
+TextInput TextSource::from(const char* at) {
+  _begin = at;
+  return [this](char* buffer, size_t size) -> ptrdiff_t {
+    if (_begin == _end && !isUnfinished()) return _hasFailed ? -1 : 0;
+    return readPieces(buffer, size);
+  };
 }
 
 TextInput TextSource::fromTheBeginning() {

@@ -27,6 +27,9 @@ class TextSource {
   TextSource(const TextSource&) = delete;
   TextSource& operator=(const TextSource&) = delete;
 
+  // What comes is wanted at once: reading does not wait for more where there is some.
+  void takeAsItComes() { _takesAsItComes = true; }
+
   // What is in hand.
   const char* begin() const { return _begin; }
   const char* end() const { return _end; }
@@ -38,12 +41,15 @@ class TextSource {
 
   // All of the text again, as often as wanted; the window is gone.
   TextInput fromTheBeginning();
+  // What is not yet read, from a place in the window on; the window is gone.
+  TextInput from(const char* at);
   // An estimate.
   size_t expectedBytes() const { return _input ? size_t{4096} : _text.size(); }
 
  private:
   void makeWindow(size_t size, const char* keep);
   void fill();
+  bool isEnough(size_t count) const;
   ptrdiff_t readPieces(char* buffer, size_t size);
   ptrdiff_t readAgain(char* buffer, size_t size);
   void freeWindow();
@@ -60,6 +66,7 @@ class TextSource {
   bool _isOver = false;
   bool _hasFailed = false;
   bool _keeps = false;
+  bool _takesAsItComes = false;
   KeptText _kept;
 };
 

@@ -13,15 +13,15 @@
 #include "Platform/Reading/ReadTree.h"
 #include "Platform/Reading/References.h"
 #include "Platform/Reading/XMLCharacters.h"
+#include "Platform/Reading/XMLPieces.h"
 #include "Platform/Reading/XMLProlog.h"
-#include "Platform/Reading/XMLRecords.h"
 #include "Platform/Text/ASCII.h"
 #include "Platform/Text/UTF8.h"
 
 #include <algorithm>
-#include <bit>
 #include <cstring>
 #include <new>
+#include <utility>
 
 namespace xquery {
 
@@ -42,15 +42,23 @@ class XMLReader {
       : _source(source), _tree(options, source.expectedBytes()), _names(_tree.tree()) {}
   NSXMLDocument* read();
 
-  // --- record by record ------------------------------------------------------------------------
-  // Before the first record.
-  NSXMLDocument* beginRecords(std::span<const XMLRecordStep> path);
-  // Null at the end of the document.
-  const NSXMLElement* readRecord();
-  // Of what is to be read next.
-  TextPlace place() const;
-  // The tree is its owner's.
-  void letGoOfTree() { static_cast<void>(_tree.finish()); }
+  // --- piece by piece --------------------------------------------------------------------------
+  bool readNextPiece();
+  bool isComplete() const { return _at == _end && _open.empty() && _hasRoot; }
+  ReadTree& tree() { return _tree; }
+  size_t depth() const { return _open.size(); }
+  bool hasRoot() const { return _hasRoot; }
+  const char* pieceStart() const { return _pieceStart; }
+  std::string_view textBehind() const {
+    return {_source.begin(), static_cast<size_t>(_at - _source.begin())};
+  }
+  TextInput rest() { return _source.from(_at); }
+  // The tree may go back to what it was, and libxml2 may go on from any piece.
+  void beginPieces(XMLPieces::Leaving leaving) {
+    _isByPieces = true;
+    _leaving = std::move(leaving);
+    start();
+  }
 
  private:
   // What has been seen of a run of text or a value: whether it stands for itself.
@@ -68,13 +76,9 @@ class XMLReader {
     const NSStringView* URI = nullptr;  // that it declares, in the tree; null for none
   };
 
-  bool getMore();
   void start();
+  bool getMore();
   const char* readPiece(const char* at);
-  bool readNextPiece();
-  const NSXMLElement* closedRecord();
-  const NSXMLElement* lookAtPiece(size_t depthBefore);
-  uint64_t enter(const NSXMLElement* element) const;
   const char* readProlog(const char* at);
   const char* readSpaceAround(const char* at);
   const char* readMarkup(const char* at);
@@ -120,22 +124,15 @@ class XMLReader {
   bool _hasType = false;
   bool _hasRoot = false;
 
-  // Outside of records, of the document and each open element: where to go back to, and how many
-  // steps of the path lead there, as bits.
-  struct Level {
-    NSXMLTreeBuilder::Mark mark;
-    uint64_t matched;
-  };
-  std::vector<Level, ValueAllocator<Level>> _levels;
-  std::span<const XMLRecordStep> _path;
-  size_t _recordDepth = 0;  // of the record that is being read; 0 outside
-  TextPlace _windowPlace;   // where the text in hand begins; not known for a whole document
+  bool _isByPieces = false;
+  const char* _pieceStart = nullptr;  // of the last one
+  XMLPieces::Leaving _leaving;
 };
 
 // --- the whole -------------------------------------------------------------------------------
 
 bool XMLReader::getMore() {
-  if (!_levels.empty()) _windowPlace = place();
+  if (_leaving) _leaving(textBehind());
   const bool isMore = _source.more(_at);
   _at = _source.begin();
   _end = _source.end();
@@ -159,94 +156,20 @@ NSXMLDocument* XMLReader::read() {
       break;
     }
   }
-  take(_at == _end && _open.empty() && _hasRoot);
+  take(isComplete());
   return _tree.finish();
 }
-
-// --- record by record ------------------------------------------------------------------------
-//
-// A loop of its own, so that nothing of this is asked where a document is read as a whole. What a
-// piece has done shows in the number of open elements. Outside of records every piece but the open
-// elements is dropped at once.
 
 // False at the end of the text.
 bool XMLReader::readNextPiece() {
   for (;;) {
     const char* const next = _at == _end ? nullptr : readPiece(_at);
     if (next) {
-      _at = next;
+      _pieceStart = std::exchange(_at, next);
       return true;
     }
     if (!getMore() && (_hasBegun || _at == _end)) return false;
   }
-}
-
-NSXMLDocument* XMLReader::beginRecords(std::span<const XMLRecordStep> path) {
-  _path = path;
-  _levels.push_back({_tree.mark(), 1});
-  start();
-  return cast<NSXMLDocument>(_tree.current());
-}
-
-// The steps that are matched where the element stands; all of them for a record.
-uint64_t XMLReader::enter(const NSXMLElement* element) const {
-  uint64_t matched = 0;
-  for (uint64_t left = _levels.back().matched; left != 0; left &= left - 1) {
-    const auto index = static_cast<size_t>(std::countr_zero(left));
-    const XMLRecordStep& step = _path[index];
-    if (step.isAnywhere) matched |= uint64_t{1} << index;
-    if (!step.name || step.name == element->expandedName()) matched |= uint64_t{2} << index;
-  }
-  return matched;
-}
-
-const NSXMLElement* XMLReader::closedRecord() {
-  _recordDepth = 0;
-  _tree.endOpenNodes();
-  return cast<NSXMLElement>(_tree.current()->firstChild());
-}
-
-TextPlace XMLReader::place() const {
-  TextPlace place = _windowPlace;
-  place.pass({_source.begin(), static_cast<size_t>(_at - _source.begin())});
-  return place;
-}
-
-// After a piece outside of records. The record, if it was a whole one. Whatever was before it below
-// the open element is gone.
-const NSXMLElement* XMLReader::lookAtPiece(size_t depthBefore) {
-  const size_t depth = _open.size();
-  if (depth < depthBefore) _levels.pop_back();
-  const bool isOpen = depth > depthBefore;
-  const NSXMLNode* const added = isOpen ? _tree.current() : _tree.current()->firstChild();
-  const auto* element = depth < depthBefore ? nullptr : dyn_cast<NSXMLElement>(added);
-  if (element) {
-    const uint64_t matched = enter(element);
-    const bool isRecord = (matched >> _path.size()) != 0;
-    if (isRecord && !isOpen) return closedRecord();
-    if (isRecord) {
-      _recordDepth = depth;
-      return nullptr;
-    }
-    if (isOpen) _levels.push_back({_tree.mark(), matched});
-  }
-  _tree.backTo(_levels.back().mark);
-  return nullptr;
-}
-
-const NSXMLElement* XMLReader::readRecord() {
-  _tree.backTo(_levels.back().mark);
-  for (;;) {
-    const size_t depthBefore = _open.size();
-    if (!readNextPiece()) break;
-    if (_recordDepth != 0) {
-      if (_open.size() < _recordDepth) return closedRecord();
-    } else if (const NSXMLElement* record = lookAtPiece(depthBefore)) {
-      return record;
-    }
-  }
-  take(_at == _end && _open.empty() && _hasRoot);
-  return nullptr;
 }
 
 const char* XMLReader::readPiece(const char* at) {
@@ -348,6 +271,7 @@ void XMLReader::addText(const Raw& text, bool isWhole) {
   if (isWhole && !_tree.hasText()) {
     _tree.addWholeText(known);
   } else {
+    if (_isByPieces) _tree.check(known);
     _tree.addText(known.bytes);
   }
 }
@@ -444,7 +368,7 @@ ReadText XMLReader::valueOf(const Raw& value) {
 void XMLReader::declareNamespaces() {
   _names.startTag();
   const auto store = [this](std::string_view URI) {
-    return _levels.empty() ? _tree.stored(ReadText(URI)) : _tree.storedLasting(ReadText(URI));
+    return _isByPieces ? _tree.storedLasting(ReadText(URI)) : _tree.stored(ReadText(URI));
   };
   for (Attribute& attribute : _attributes) {
     if (!attribute.name->declares) continue;
@@ -534,7 +458,9 @@ const char* XMLReader::readSection(const char* at) {
     if (_end - at < 3) return nullptr;
     if (at[1] == ']' && at[2] == '>') break;
   }
-  _tree.addSection(linesOf({begin, at}).bytes);
+  const ReadText text = linesOf({begin, at});
+  if (_isByPieces) _tree.check(text);
+  _tree.addSection(text.bytes);
   return at + 3;
 }
 
@@ -565,73 +491,6 @@ const char* XMLReader::readInstruction(const char* at) {
 
 // --- the doors -------------------------------------------------------------------------------
 
-class XMLRecords::Reading {
- public:
-  Reading(TextSource& source, std::span<const XMLRecordStep> path, uint32_t options)
-      : _path(path.begin(), path.end()),
-        _reader(source, options),
-        _document(_reader.beginRecords(_path)) {}
-  ~Reading() { _reader.letGoOfTree(); }
-  Reading(const Reading&) = delete;
-  Reading& operator=(const Reading&) = delete;
-
-  const NSXMLElement* next() {
-    if (_isOver) return nullptr;
-    const NSXMLElement* record = nullptr;
-    try {
-      record = _reader.readRecord();
-      _isAtEnd = !record;
-    } catch (const NotTaken&) {
-    } catch (const LibXMLStop&) {
-    }
-    _isOver = !record;
-    return record;
-  }
-  bool isAtEnd() const { return _isAtEnd; }
-  TextPlace place() const { return _reader.place(); }
-  NSXMLDocument* document() const { return _document.get(); }
-
- private:
-  const std::vector<XMLRecordStep> _path;
-  XMLReader _reader;
-  const Ref<NSXMLDocument> _document;
-  bool _isOver = false;
-  bool _isAtEnd = false;
-};
-
-void TextPlace::pass(std::string_view text) {
-  const auto count = std::count(text.begin(), text.end(), '\n');
-  const size_t last = text.rfind('\n');
-  line += count;
-  column = last == text.npos ? column + static_cast<int64_t>(text.size())
-                             : static_cast<int64_t>(text.size() - last);
-}
-
-XMLRecords::XMLRecords(TextSource& source, std::span<const XMLRecordStep> path, uint32_t options)
-    : _reading(std::make_unique<Reading>(source, path, options)) {}
-
-XMLRecords::~XMLRecords() = default;
-
-const NSXMLElement* XMLRecords::next() {
-  return _reading->next();
-}
-
-bool XMLRecords::isAtEnd() const {
-  return _reading->isAtEnd();
-}
-
-TextPlace XMLRecords::place() const {
-  return _reading->place();
-}
-
-uint32_t XMLRecords::references() const {
-  return __atomic_load_n(&NSXMLTree::of(document())->references, __ATOMIC_RELAXED);
-}
-
-NSXMLDocument* XMLRecords::document() const {
-  return _reading->document();
-}
-
 Ref<NSXMLDocument> readXML(TextSource& source, uint32_t options) {
   try {
     return Ref<NSXMLDocument>(XMLReader(source, options).read());
@@ -640,6 +499,48 @@ Ref<NSXMLDocument> readXML(TextSource& source, uint32_t options) {
   } catch (const std::bad_alloc&) {
   }
   return nullptr;
+}
+
+class XMLPieces::Reading : public XMLReader {
+ public:
+  using XMLReader::XMLReader;
+};
+
+XMLPieces::XMLPieces(TextSource& source, uint32_t options, Leaving leaving)
+    : _reading(std::make_unique<Reading>(source, options)) {
+  _reading->beginPieces(std::move(leaving));
+}
+
+XMLPieces::~XMLPieces() = default;
+
+void XMLPieces::letGoOfTree() {
+  static_cast<void>(_reading->tree().finish());
+}
+
+size_t XMLPieces::read() {
+  if (_reading->readNextPiece()) return _reading->depth();
+  take(_reading->isComplete());
+  return none;
+}
+
+ReadTree& XMLPieces::tree() {
+  return _reading->tree();
+}
+
+bool XMLPieces::hasRoot() const {
+  return _reading->hasRoot();
+}
+
+const char* XMLPieces::lastPiece() const {
+  return _reading->pieceStart();
+}
+
+std::string_view XMLPieces::textBehind() const {
+  return _reading->textBehind();
+}
+
+TextInput XMLPieces::rest() {
+  return _reading->rest();
 }
 
 }  // namespace xquery

@@ -2,16 +2,21 @@
 // above it with their attributes and namespaces, and nothing else.
 //
 // Every record takes the memory of the one before, so that reading takes no more than the largest
-// record does, however long the document is. Nothing of the text is kept either.
+// record does, however long the document is. Of the text nothing is kept but what is before the
+// document element. What does grow is the table of names, with each name and namespace that the
+// document has not used before.
+//
+// Our reader reads as far as it takes the text, and libxml2 goes on from there: with the errors,
+// and the places of errors, of one that has read all of it.
 #pragma once
 
 #include "Platform/Reading/TextSource.h"
 #include "xquery/XMLNode.h"
 
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <span>
-#include <string_view>
 #include <vector>
 
 namespace xquery {
@@ -24,14 +29,6 @@ struct XMLRecordStep {
 };
 constexpr size_t mostRecordSteps = 63;
 
-// Counted from 1; columns in bytes.
-struct TextPlace {
-  int64_t line = 1;
-  int64_t column = 1;
-
-  void pass(std::string_view text);
-};
-
 class XMLRecords {
  public:
   // `source` should not keep what it has read: one with a rewinding. The names live as long as this
@@ -41,14 +38,12 @@ class XMLRecords {
   XMLRecords(const XMLRecords&) = delete;
   XMLRecords& operator=(const XMLRecords&) = delete;
 
-  // The next record; the one before must not be referred to any more. Null at the end of the
-  // document, and where the text is none that our reader takes.
-  const NSXMLElement* next();
-  // Whether all of the document has been read.
-  bool isAtEnd() const;
-  // After the last record, where not all has been read: where the piece of the document begins that
-  // our reader does not take.
-  TextPlace place() const;
+  // Looks at a record, which must not be referred to afterwards; false ends the reading.
+  using Receiver = std::function<bool(const NSXMLElement& record)>;
+  // Once. False, with the error, where the document is not well formed, after the records before
+  // that. What the receiver throws is thrown on.
+  [[nodiscard]] bool read(const Receiver& receive, NSXMLParseError& error);
+
   // Above the records; the same all the time.
   NSXMLDocument* document() const;
   // How many references to the document, its nodes and their texts there are, this object's

@@ -210,6 +210,18 @@ void NSXMLTreeBuilder::backTo(const Mark& mark) {
   }
 }
 
+void NSXMLTreeBuilder::dropOpenElement() {
+  NSXMLNode* const dropped = _current;
+  _current = dropped->parent();
+  if (NSXMLTree::firstChildOf(_current) == dropped) {
+    _lastChild = nullptr;
+    NSXMLTree::firstChildOf(_current) = nullptr;
+  } else {
+    _lastChild = NSXMLTree::previousOf(dropped);
+    NSXMLTree::nextOf(_lastChild) = nullptr;
+  }
+}
+
 void NSXMLTreeBuilder::endOpenNodes() {
   NSXMLNode* last = _lastChild;
   for (NSXMLNode* node = _current; node; node = node->parent()) {

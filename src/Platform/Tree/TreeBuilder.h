@@ -66,6 +66,8 @@ class NSXMLTreeBuilder {
   void backTo(const Mark& mark);
   // What is there can be walked, as if the open nodes ended here; more may be added afterwards.
   void endOpenNodes();
+  // The open element, which has no children, is as if it had not been there.
+  void dropOpenElement();
 
   // What a node of the kind and its text take of nodes and of texts.
   static void addRoom(Kind kind, NSStringView text, size_t& nodeBytes, size_t& textBytes);

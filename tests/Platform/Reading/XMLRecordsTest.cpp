@@ -7,6 +7,7 @@
 #include <gtest/gtest.h>
 
 #include <new>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -72,15 +73,23 @@ std::string expected(const std::string& text, const Path& path, uint32_t options
   return all;
 }
 
+std::string shownError(const NSXMLParseError& error) {
+  return std::to_string(error.line) + ":" + std::to_string(error.column) + ": " + error.message;
+}
+
+// With the error that ends the document, as all readers tell it.
 std::string actual(TextSource& source, const Path& path, uint32_t options) {
   XMLRecords records(source, path.steps, options);
   std::string all;
-  while (const NSXMLElement* record = records.next()) {
-    EXPECT_EQ(record->rootDocument(), records.document());
-    EXPECT_FALSE(record->nextSibling() || record->previousSibling());
-    all += shown(record);
-  }
-  return all + (records.isAtEnd() ? "" : "not taken");
+  NSXMLParseError error;
+  const auto receive = [&](const NSXMLElement& record) {
+    EXPECT_EQ(record.rootDocument(), records.document());
+    EXPECT_FALSE(record.nextSibling() || record.previousSibling());
+    all += shown(&record);
+    return true;
+  };
+  if (records.read(receive, error)) return all;
+  return all + shownError(error);
 }
 
 constexpr std::string_view paths[] = {"/a/b",  "/a/b/c", "//c",    "/a/*",   "/a//c",
@@ -119,16 +128,129 @@ TEST(XMLRecords, AreThoseOfTheWholeTree) {
   }
 }
 
-TEST(XMLRecords, EndWhereTheTextIsNotTaken) {
-  const Path path("/a/b");
-  for (const std::string text : {"<a><b>1</b><b>2</a>", "<a><b>1</b><b>2</b>", "<a><b>1</b>&e;</a>",
-                                 "<a><b>1</b></a>x", "<a><b>1</b><b><c></d></b></a>"}) {
-    TextSource source(text);
-    const std::string all = actual(source, path, 0);
-    EXPECT_TRUE(all.starts_with("a/<b>1</b>\n")) << all;
-    EXPECT_TRUE(all.ends_with("not taken")) << all;
+// --- what our reader does not take -----------------------------------------------------------
+
+const std::string otherDocuments[] = {
+    "<!DOCTYPE a [<!ENTITY e '<c>1</c>'><!ATTLIST b k CDATA 'd'>]>\n<a><b>&e;</b><b/>&e;</a>",
+    "<?xml version='1.0' encoding='ISO-8859-1'?><a><b>\xE9</b><b><c>\xE8</c></b></a>",
+    "<!DOCTYPE a [<!ENTITY e 'x'>]><a "
+    "xmlns:p='u'><p:b><p:c/></p:b><b><c><![CDATA[x]]>&e;</c></b></a>",
+    "<a><b><c>1</c></b><b><c p='1'>2</c></b>\n</a><!-- end -->\n<?p x?>\n",
+};
+
+// The text as UTF-16 with a mark, of ASCII.
+std::string UTF16(std::string_view text) {
+  std::string units = "\xFF\xFE";
+  for (const char byte : text) units += {byte, '\0'};
+  return units;
+}
+
+TEST(XMLRecords, AreThoseOfTheWholeTreeWhereOurReaderDoesNotTakeTheText) {
+  std::vector<std::string> texts(std::begin(otherDocuments), std::end(otherDocuments));
+  texts.push_back(UTF16("<a><b><c>1</c></b>\n<b/></a>"));
+  for (const std::string& text : texts) {
+    for (const std::string_view path : paths) {
+      for (const uint32_t options : readingtest::allOptions) {
+        const Path steps(path);
+        const std::string all = expected(text, steps, options);
+        for (const size_t piece : {1, 100}) {
+          TextSource pieces(
+              readingtest::inPieces(text, piece), [] { return false; }, piece, piece);
+          EXPECT_EQ(actual(pieces, steps, options), all) << text << path;
+        }
+      }
+    }
   }
 }
+
+// What breaks a rule, behind this and before that.
+constexpr std::string_view broken[] = {
+    "<b>1</a>",
+    "<b>1",
+    "<b",
+    "<b><c>\n<d></c></b>",
+    "&e;",
+    "<b i='1' i='2'/>",
+    "<b xmlns:p='u' xmlns:q='u' p:i='1' q:i='2'>x</b>",
+    "<p:b/>",
+    "<b p:i='1'/>",
+    "<b>]]></b>",
+    "t\xFF<!--c-->",
+    "<b><c>\xC3</c></b>",
+    "<b>x\xFF<![CDATA[y]]></b>",
+    "<b><![CDATA[\xFF]]><c/></b>",
+    "<b>\x01</b>",
+    "<!-- -- -->",
+    "<?xml version='1.0'?>",
+    "<b i=1/>",
+    "<b i='<'/>",
+    "<b>&#0;</b>",
+    "</a><a/>",
+    "</a>x",
+    "</a>\n<!--c-->\n&lt;",
+    "<!DOCTYPE a>",
+};
+constexpr std::string_view starts[] = {
+    "",
+    "<a>",
+    "<?xml version='1.0'?>\n<!-- \n -->\n<a\n i='1'>t\n",
+    "<!DOCTYPE a SYSTEM 'a.dtd'>\n<a xmlns:n='a&quot;&#10;b' xmlns='v'><b>\n<c>1</c></b>\n <n:x>\n",
+    "<a>\n<b>\xC3\xA9</b><b xml:space='preserve'>\xC3\xA9<c k='1'>\n<d>",
+};
+
+TEST(XMLRecords, EndWithTheErrorOfTheWholeTree) {
+  for (const std::string_view start : starts) {
+    for (const std::string_view wrong : broken) {
+      const std::string text = std::string(start) + std::string(wrong) + "\n<b>3</b></a>";
+      NSXMLParseError error;
+      EXPECT_FALSE(NSXMLDocument::documentWithData(text, 0, &error)) << text;
+      for (const std::string_view path : {"/a/b", "//c", "/q/r"}) {
+        for (const size_t piece : {1, 7, 1000}) {
+          TextSource pieces(
+              readingtest::inPieces(text, piece), [] { return false; }, piece, piece);
+          const std::string all = actual(pieces, Path(path), 0);
+          EXPECT_TRUE(all.ends_with(shownError(error))) << text << "\n"
+                                                        << path << piece << "\n"
+                                                        << all << "\n"
+                                                        << shownError(error);
+        }
+      }
+    }
+  }
+}
+
+TEST(XMLRecords, BeforeAnErrorAreHandedOut) {
+  TextSource source("<a><b>1</b>\n<b>2</b><b>3</a>");
+  EXPECT_EQ(actual(source, Path("/a/b"), 0),
+            "a/<b>1</b>\na/<b>2</b>\n2:17: Opening and ending tag mismatch: b line 2 and a");
+}
+
+TEST(XMLRecords, EndWhenTheReceiverHasEnough) {
+  for (const std::string text :
+       {"<a><b/><b/><b/></a", "<!DOCTYPE a [<!ENTITY e ''>]><a><b/><b/>x"}) {
+    TextSource source(text);
+    const Path path("/a/b");
+    XMLRecords records(source, path.steps, 0);
+    NSXMLParseError error;
+    int count = 0;
+    EXPECT_TRUE(records.read([&](const NSXMLElement&) { return ++count < 2; }, error));
+    EXPECT_EQ(count, 2);
+    EXPECT_EQ(error.message, "");
+  }
+}
+
+TEST(XMLRecords, PassOnWhatTheReceiverThrows) {
+  for (const std::string text : {"<a><b/></a>", "<!DOCTYPE a [<!ENTITY e ''>]><a><b/></a>"}) {
+    TextSource source(text);
+    const Path path("/a/b");
+    XMLRecords records(source, path.steps, 0);
+    NSXMLParseError error;
+    const auto receive = [](const NSXMLElement&) -> bool { throw std::length_error("its own"); };
+    EXPECT_THROW(static_cast<void>(records.read(receive, error)), std::length_error);
+  }
+}
+
+// --- memory ----------------------------------------------------------------------------------
 
 // So many bytes of records that are numbered.
 TextInput manyRecords(size_t bytes) {
@@ -154,10 +276,13 @@ TEST(XMLRecords, TakeNoMoreMemoryHoweverLongTheDocumentIs) {
   const Path path("/a/b");
   XMLRecords records(source, path.steps, NSXMLNodePreserveWhitespace);
   size_t count = 0;
-  while (const NSXMLElement* record = records.next()) {
-    EXPECT_EQ(record->firstAttribute()->textView().utf8(), std::to_string(count++));
-  }
-  EXPECT_TRUE(records.isAtEnd());
+  NSXMLParseError error;
+  EXPECT_TRUE(records.read(
+      [&](const NSXMLElement& record) {
+        EXPECT_EQ(record.firstAttribute()->textView().utf8(), std::to_string(count++));
+        return true;
+      },
+      error));
   EXPECT_GT(count, 60'000U);
 }
 
@@ -168,8 +293,11 @@ TEST(XMLRecords, ThatAreLargerThanTheCeilingEndInALimit) {
   TextSource source(text);
   const Path path("/a/b");
   XMLRecords records(source, path.steps, 0);
-  EXPECT_TRUE(records.next());
-  EXPECT_THROW(static_cast<void>(records.next()), std::bad_alloc);
+  NSXMLParseError error;
+  int count = 0;
+  const auto receive = [&](const NSXMLElement&) { return ++count > 0; };
+  EXPECT_THROW(static_cast<void>(records.read(receive, error)), std::bad_alloc);
+  EXPECT_EQ(count, 1);
   EXPECT_TRUE(workMeter.wasRefused);
 }
 
