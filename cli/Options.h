@@ -50,7 +50,7 @@ struct Options {
   bool html = false;
   bool stripSpace = false;
   bool time = false;
-  bool stream = false;                           // there is an input then
+  bool stream = false;                           // there is an input then, or a plan is asked for
   std::optional<xquery::XQueryPlanFormat> plan;  // to be shown instead of the result
   unsigned repeat = 1;
   unsigned jobs = 0;  // 0: as many as there are processors

@@ -19,7 +19,8 @@ using namespace xquery;
 
 void printPlan(const Options& options, const XQuery& query) {
   Output output;
-  const std::string plan = query.planDescription(*options.plan)->utf8();
+  const std::string plan = options.stream ? XQueryStreamDescription(query)
+                                          : query.planDescription(*options.plan)->utf8();
   if (output.open(options.outputFile) && output.append(plan) && output.finish()) return;
   const std::string name = options.outputFile.value_or("standard output");
   throw Failure{StatusInput, "xquery: cannot write " + name + ": " + output.error(), {}};

@@ -112,8 +112,8 @@ Status Stream::finish(const std::optional<Failure>& failure) {
 
 void checkStream(const Options& options) {
   const auto refuse = [](const char* what) { throw WrongUsage("--stream " + std::string(what)); };
-  if (options.check) return;
-  if (options.plan) refuse("excludes --plan");
+  if (options.check || options.plan == XQueryPlanFormat::Text) return;
+  if (options.plan) refuse("excludes --plan=json and --plan=dot");
   if (options.inputs.size() != 1 || options.filesFrom) refuse("requires one INPUT");
   if (options.html) refuse("excludes --html");
   if (options.repeat > 1) refuse("excludes --repeat");

@@ -35,4 +35,15 @@ struct XQueryStreamFailure {
   NSXMLParseError reading;
 };
 
+class XQuery;
+
+// How a query that was compiled to be streamed is evaluated, for people, in UTF-8: the path to the
+// records, and what is made of what they give.
+//
+//   record: /site/people/person
+//   result: count
+//
+// Empty for a query that was compiled otherwise, or with errors.
+[[nodiscard]] XQUERY_EXPORT std::string XQueryStreamDescription(const XQuery& query);
+
 }  // namespace xquery

@@ -52,6 +52,21 @@ TEST(StreamCommand, RefusesBeforeAnythingIsRead) {
   EXPECT_EQ(xquery({"--stream", "-e", "/a/b", "/no/such/file"}).status, 3);
 }
 
+TEST(StreamCommand, ShowsHowItWouldBeDone) {
+  const auto plan = [](const std::string& query) {
+    return xquery({"--stream", "--plan", "-e", query});
+  };
+  EXPECT_EQ(plan("/a/b[c]/d").out, "record: /a/b\nresult: items as they are found\n");
+  EXPECT_EQ(plan("count(/a//b)").out, "record: /a//b\nresult: count\n");
+  EXPECT_EQ(plan("(/a/*/c)[2]").out, "record: /a/*/c\nresult: items from position 2 to 2\n");
+  EXPECT_EQ(plan("subsequence(/a/b, 3)").out, "record: /a/b\nresult: items from position 3\n");
+  EXPECT_EQ(plan("every $b in /a/b satisfies $b = 1").out, "record: /a/b\nresult: every\n");
+  const Outcome refused = plan("\nreverse(/a/b)");
+  EXPECT_EQ(refused.status, 1);
+  EXPECT_THAT(refused.err, HasSubstr("the function needs the whole of its argument\" at line:2"));
+  EXPECT_EQ(xquery({"--stream", "--plan=json", "-e", "/a/b"}).status, 2);
+}
+
 TEST(StreamCommand, WantsAnInputAndNothingThatIsDoneTwice) {
   EXPECT_EQ(xquery({"--stream", "-e", "/a/b"}).status, 2);
   EXPECT_EQ(xquery({"--stream", "--html", "-e", "/a/b", "-"}).status, 2);

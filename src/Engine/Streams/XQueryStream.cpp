@@ -211,4 +211,9 @@ bool XQueryContext::evaluateStream(const XQuery& query, const XQueryConstants& c
   return true;
 }
 
+std::string XQueryStreamDescription(const XQuery& query) {
+  const XQueryStreamProgram* const program = query._internal().streamProgram();
+  return program ? program->description : std::string();
+}
+
 }  // namespace xquery

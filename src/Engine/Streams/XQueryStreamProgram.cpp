@@ -29,6 +29,7 @@ std::unique_ptr<XQueryStreamProgram> programOf(const XQueryProgram& program,
         {step.isAnywhere, Ref<XQueryNameTest>(const_cast<XQueryNameTest*>(step.name))});
   }
   result->fold = plan.fold;
+  result->description = plan.description();
   result->first = plan.first;
   result->last = plan.last;
   result->each = Ref<XQueryExpr>(program[plan.each].expr);

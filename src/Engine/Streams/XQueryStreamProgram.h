@@ -9,6 +9,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <string>
 #include <vector>
 
 namespace xquery {
@@ -30,6 +31,7 @@ struct XQueryStreamProgram {
   Ref<XQueryExpr> each;
   // Whose argument that is; null for a fold without a function.
   Ref<XQueryFunctionCall> call;
+  std::string description;  // XQueryStreamPlan::description
 
   // Of a query that has been bound. Null, with the refusal, for one that cannot be evaluated so.
   [[nodiscard]] static std::unique_ptr<const XQueryStreamProgram> of(const XQueryProlog& prolog,

@@ -397,6 +397,22 @@ std::string XQueryStreamPlan::recordPath() const {
   return path;
 }
 
+std::string XQueryStreamPlan::description() const {
+  std::string result = "items as they are found";
+  if (fold == XQueryStreamFold::Some) result = "some";
+  if (fold == XQueryStreamFold::Every) result = "every";
+  if (fold == XQueryStreamFold::Part) {
+    const bool isOpen = last == std::numeric_limits<uint64_t>::max();
+    result = "items from position " + std::to_string(first) +
+             (isOpen ? "" : " to " + std::to_string(last));
+  } else {
+    for (const FoldOfFunction& row : folds) {
+      if (row.fold == fold) result = row.name;
+    }
+  }
+  return "record: " + recordPath() + "\nresult: " + result + "\n";
+}
+
 XQueryStreamPlan XQueryPlanStream(const XQueryProgram& program, const XQueryFactTable& facts) {
   return Analysis(program, facts).run();
 }

@@ -70,6 +70,8 @@ struct XQueryStreamPlan {
   bool isPossible() const { return refusedAt == XQueryNoPlace; }
   // As a path: "/site/people/person", "//item".
   std::string recordPath() const;
+  // For people: a line for the record, and one for the fold.
+  std::string description() const;
 };
 
 // Of a program with a body, as it was written: before rules have changed it.
