@@ -99,7 +99,7 @@ void TextSource::fill() {
 bool TextSource::isEnough(size_t count) const {
   constexpr size_t shortPiece = 4096;
   const auto before = static_cast<size_t>(_end - _begin);
-  return _takesAsItComes && count > (before < shortPiece ? 0 : before / 8);
+  return _takesAsItComes && count > (before < shortPiece ? 0 : before / 2);
 }
 
 // Large pieces of the input, for a reader of small ones.

@@ -64,6 +64,44 @@ TEST(TextSource, WhatIsKeptStaysInFrontOfWhatComes) {
   }
 }
 
+TEST(TextSource, HandsOutWhatComesAtOnceWhereThatIsWanted) {
+  const std::string all(100'000, 'x');
+  TextSource waiting(readingtest::inPieces(all, 10), {}, 1000, 1000);
+  EXPECT_TRUE(waiting.more(waiting.begin()));
+  EXPECT_EQ(waiting.end() - waiting.begin(), 1000);
+  TextSource source(readingtest::inPieces(all, 10), {}, 1000, 1000);
+  source.takeAsItComes();
+  EXPECT_TRUE(source.more(source.begin()));
+  EXPECT_EQ(source.end() - source.begin(), 10);
+  EXPECT_TRUE(source.more(source.begin()));
+  EXPECT_EQ(source.end() - source.begin(), 20);
+  // But a long piece is not begun again for a few bytes.
+  int times = 0;
+  while (source.more(source.begin())) ++times;
+  EXPECT_EQ(source.end() - source.begin(), 100'000);
+  EXPECT_LT(times, 500);
+}
+
+TEST(TextSource, IsReadOnFromWhereItsReaderStopped) {
+  const std::string all = "0123456789abcdefghij";
+  for (const size_t piece : {1, 3, 100}) {
+    TextSource source(readingtest::inPieces(all, piece), {}, 4, 8);
+    while (source.end() - source.begin() < 4) EXPECT_TRUE(source.more(source.begin()));
+    const TextInput rest = source.from(source.begin() + 2);
+    std::string text;
+    char buffer[3];
+    for (ptrdiff_t count; (count = rest(buffer, sizeof buffer)) > 0;) {
+      text.append(buffer, static_cast<size_t>(count));
+    }
+    EXPECT_EQ(text, all.substr(2));
+  }
+  TextSource memory(all);
+  char buffer[100];
+  const TextInput rest = memory.from(memory.begin() + 5);
+  EXPECT_EQ(rest(buffer, sizeof buffer), 15);
+  EXPECT_EQ(rest(buffer, sizeof buffer), 0);
+}
+
 TEST(TextSource, APipeIsReadAgainFromWhatWasKept) {
   const std::string all = text(600000);
   TextSource source(readingtest::inPieces(all, 1000));

@@ -219,6 +219,33 @@ TEST(XMLRecords, EndWithTheErrorOfTheWholeTree) {
   }
 }
 
+// Places are those of the text, whatever is left out of what libxml2 is given.
+TEST(XMLRecords, EndAtThePlaceOfTheWholeTreeFarBehindInTheText) {
+  std::string text = "<a>\n<b>";
+  for (int i = 0; i < 3000; ++i) text += "<c>\n<d>\xC3\xA9</d></c>";
+  for (const std::string_view wrong : {"<e>\n\n</b>", "&e;", "</b>\n<c></a>"}) {
+    NSXMLParseError error;
+    EXPECT_FALSE(NSXMLDocument::documentWithData(text + std::string(wrong), 0, &error));
+    for (const std::string_view path : {"/a/b", "//d"}) {
+      const std::string all = text + std::string(wrong);
+      TextSource pieces(
+          readingtest::inPieces(all, 1000), [] { return false; }, 1000, 1000);
+      EXPECT_TRUE(actual(pieces, Path(path), 0).ends_with(shownError(error))) << shownError(error);
+    }
+  }
+}
+
+TEST(XMLRecords, MayBeDeep) {
+  constexpr int levels = 50'000;
+  std::string text = "<a><b>";
+  for (int i = 0; i < levels; ++i) text += "<c>\n";
+  NSXMLParseError error;
+  EXPECT_FALSE(NSXMLDocument::documentWithData(text + "&e;", 0, &error));
+  const std::string all = text + "&e;";
+  TextSource source(all);
+  EXPECT_EQ(actual(source, Path("/a/b"), 0), shownError(error));
+}
+
 TEST(XMLRecords, BeforeAnErrorAreHandedOut) {
   TextSource source("<a><b>1</b>\n<b>2</b><b>3</a>");
   EXPECT_EQ(actual(source, Path("/a/b"), 0),
