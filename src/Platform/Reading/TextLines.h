@@ -17,6 +17,8 @@ struct TextPlace {
   int64_t column = 1;
 
   void pass(std::string_view text);
+  // Of a text of so many line feeds.
+  void pass(std::string_view text, int64_t lines);
 };
 
 class TextLines {

@@ -185,8 +185,13 @@ void NSXMLTreeBuilder::backTo(const Mark& mark) {
   _tree->dropIndexes();
   const bool keepsNodes = _nodeBlock != mark.nodeBlock;
   const bool keepsTexts = _textBlock != mark.textBlock;
-  freeBlocksBehind(mark.lastBlock, keepsNodes ? _nodeBlock : nullptr,
-                   keepsTexts ? _textBlock : nullptr);
+  // Mostly none has been begun since the last time.
+  if (_tree->_lastBlock != _lastKept || mark.lastBlock != _lastMarked) {
+    freeBlocksBehind(mark.lastBlock, keepsNodes ? _nodeBlock : nullptr,
+                     keepsTexts ? _textBlock : nullptr);
+    _lastKept = _tree->_lastBlock;
+    _lastMarked = mark.lastBlock;
+  }
   if (keepsNodes) {
     beginNodeBlock(_nodeBlock);
   } else {

@@ -134,6 +134,9 @@ class NSXMLTreeBuilder {
   char* _textEnd = nullptr;
   size_t _nextNodeBlock;
   size_t _nextTextBlock;
+  // The tree's last block when its builder went back, and that of the mark.
+  const NSXMLBlock* _lastKept = nullptr;
+  const NSXMLBlock* _lastMarked = nullptr;
 };
 
 // --- how ---------------------------------------------------------------------------------------
