@@ -92,6 +92,12 @@ std::string actual(TextSource& source, const Path& path, uint32_t options) {
   return all + shownError(error);
 }
 
+std::string inPieces(const std::string& text, size_t piece, const Path& path, uint32_t options) {
+  TextSource source(
+      readingtest::inPieces(text, piece), [] { return false; }, piece, piece);
+  return actual(source, path, options);
+}
+
 constexpr std::string_view paths[] = {"/a/b",  "/a/b/c", "//c",    "/a/*",   "/a//c",
                                       "//b/c", "//b//c", "//*//c", "/a/x/y", "//q"};
 
@@ -119,9 +125,7 @@ TEST(XMLRecords, AreThoseOfTheWholeTree) {
         TextSource memory(text);
         EXPECT_EQ(actual(memory, steps, options), all) << text << path;
         for (const size_t piece : {1, 3, 100}) {
-          TextSource pieces(
-              readingtest::inPieces(text, piece), [] { return false; }, piece, piece);
-          EXPECT_EQ(actual(pieces, steps, options), all) << text << path;
+          EXPECT_EQ(inPieces(text, piece, steps, options), all) << text << path;
         }
       }
     }
@@ -154,9 +158,7 @@ TEST(XMLRecords, AreThoseOfTheWholeTreeWhereOurReaderDoesNotTakeTheText) {
         const Path steps(path);
         const std::string all = expected(text, steps, options);
         for (const size_t piece : {1, 100}) {
-          TextSource pieces(
-              readingtest::inPieces(text, piece), [] { return false; }, piece, piece);
-          EXPECT_EQ(actual(pieces, steps, options), all) << text << path;
+          EXPECT_EQ(inPieces(text, piece, steps, options), all) << text << path;
         }
       }
     }
@@ -206,9 +208,7 @@ TEST(XMLRecords, EndWithTheErrorOfTheWholeTree) {
       EXPECT_FALSE(NSXMLDocument::documentWithData(text, 0, &error)) << text;
       for (const std::string_view path : {"/a/b", "//c", "/q/r"}) {
         for (const size_t piece : {1, 7, 1000}) {
-          TextSource pieces(
-              readingtest::inPieces(text, piece), [] { return false; }, piece, piece);
-          const std::string all = actual(pieces, Path(path), 0);
+          const std::string all = inPieces(text, piece, Path(path), 0);
           EXPECT_TRUE(all.ends_with(shownError(error))) << text << "\n"
                                                         << path << piece << "\n"
                                                         << all << "\n"
