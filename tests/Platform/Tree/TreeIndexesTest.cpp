@@ -174,7 +174,7 @@ TEST(XMLNameIndex, CountsWhatItLists) {
           if (isNamed && names.takes(*all[i])) expected.push_back(all[i]);
         }
         const auto listed = index->nodes(names, all[from], stop);
-        ASSERT_EQ(Nodes(listed.begin(), listed.end()), expected);
+        ASSERT_EQ(Nodes(listed.span().begin(), listed.span().end()), expected);
         ASSERT_EQ(index->count(names, all[from], stop), expected.size());
       }
     }
