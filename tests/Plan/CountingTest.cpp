@@ -153,6 +153,53 @@ TEST(Counting, NodesOfSeveralNames) {
   }
 }
 
+TEST(Counting, NodesOfAnyKind) {
+  for (const char* text : {
+           "count(//node())",
+           "count(//text())",
+           "count(//comment())",
+           "count(//processing-instruction())",
+           "count(//processing-instruction('a'))",
+           "count(//*)",
+           "count(//@*)",
+           "count(/r//node())",
+           "count(/r/*//node())",
+           "count(/r/*/descendant::*)",
+           "count(/r/x/descendant-or-self::node())",
+           "count(//x//node())",
+           "count(/r/*//text())",
+           "count(//node()/..)",
+           "count(//node()) > 5",
+           "3 > count(//text())",
+           "exists(//comment())",
+           "count(/descendant::node())",
+           "count(//none:*)",
+           "count(//none:a)",
+       }) {
+    for (const bool withInstruction : {false, true}) {
+      const Value& nodes = manyNames(withInstruction);
+      sameBothWays("for $t in 1 to 3 return (" + std::string(text) + ")", nodes);
+      sameBothWays(text, nodes);
+    }
+  }
+}
+
+TEST(Counting, NodesBelowOneAreNotKept) {
+  constexpr int count = 100'000;
+  std::string text = "<r>";
+  for (int i = 0; i < count; ++i) text += "<a/>x";
+  const Value nodes = document(text + "</r>");
+  const auto context = XQueryContext::xqueryContext();
+  XQueryLimits limits;
+  limits.memoryCeiling = size_t{count} * sizeof(void*);
+  context->contextSetLimits(limits);
+  Ref<XQueryError> error;
+  const auto query = XQuery::xqueryWithSource("count(//node())");
+  const auto items = context->evaluateXQuery(*query, {}, nodes, &error);
+  ASSERT_FALSE(error) << error->description()->utf8();
+  EXPECT_EQ(XQueryItemStringValue(*items->objectAtIndex(0)), std::to_string(2 * count + 1));
+}
+
 TEST(Counting, WhatStandsBetweenCommasFailsInItsTurn) {
   for (const char* text : {
            "count((//a, error()))",

@@ -25,56 +25,53 @@ bool descendantsAreSubtree(const NSXMLNode* node) {
   return XQueryDescendantStop(node) || !node->parent() || !node->parent()->parent();
 }
 
-// Counts the nodes of a name: those that the index has, without looking at them.
+// Counts nodes that no other walk finds, so that none has to be kept.
 class CountVisit {
  public:
-  CountVisit(const NSXMLExpandedName* name, XQueryPathResults& results, XQueryContext& context)
-      : _name(name), _results(results), _context(context) {}
+  CountVisit(XQueryStepTest& test, XQueryPathResults& results) : _test(test), _results(results) {}
 
   bool operator()(NSXMLNode* found) {
-    const bool isNamed = found->kind() == Kind::Element || found->kind() == Kind::Attribute;
-    if (isNamed && found->expandedName() == _name) _results.addNode(found, _context);
+    if (_test.matches(found)) _results.addNumber(1);
     return !_results.isComplete();
   }
+
+ protected:
+  bool add(std::optional<uint64_t> number) const {
+    if (number) _results.addNumber(*number);
+    return number.has_value();
+  }
+
+  XQueryStepTest& _test;
+  XQueryPathResults& _results;
+};
+
+// The same for nodes of a name: those that the index has, without looking at them.
+class CountNamedVisit : public CountVisit {
+ public:
+  using CountVisit::CountVisit;
+
   bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
-    return add(NSXMLIndexedElements(_name, first, stop));
+    return add(numberOf(NSXMLIndexedElements(_test.onlyName(), first, stop)));
   }
   bool visitIndexedAttributes(const NSXMLNode* first, const NSXMLNode* stop) const {
-    return add(NSXMLIndexedAttributes(_name, first, stop));
+    return add(numberOf(NSXMLIndexedAttributes(_test.onlyName(), first, stop)));
   }
 
  private:
-  bool add(const std::optional<NSXMLIndexedNodes>& indexed) const {
-    if (indexed) _results.addNumber(indexed->nodes.size());
-    return indexed.has_value();
+  static std::optional<uint64_t> numberOf(const std::optional<NSXMLIndexedNodes>& indexed) {
+    return indexed ? std::optional<uint64_t>(indexed->nodes.size()) : std::nullopt;
   }
-
-  const NSXMLExpandedName* _name;
-  XQueryPathResults& _results;
-  XQueryContext& _context;
 };
 
 // The same for a test that takes several names.
-class CountChoiceVisit {
+class CountChoiceVisit : public CountVisit {
  public:
-  CountChoiceVisit(XQueryStepTest& test, XQueryPathResults& results, XQueryContext& context)
-      : _test(test), _results(results), _context(context) {}
+  using CountVisit::CountVisit;
 
-  bool operator()(NSXMLNode* found) {
-    if (_test.matches(found)) _results.addNode(found, _context);
-    return !_results.isComplete();
-  }
   bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
-    const auto count =
-        NSXMLCountIndexedElements(*_test.onlyNames(), _test.acceptsInstructions(), first, stop);
-    if (count) _results.addNumber(*count);
-    return count.has_value();
+    return add(
+        NSXMLCountIndexedElements(*_test.onlyNames(), _test.acceptsInstructions(), first, stop));
   }
-
- private:
-  XQueryStepTest& _test;
-  XQueryPathResults& _results;
-  XQueryContext& _context;
 };
 
 }  // namespace
@@ -262,7 +259,7 @@ void XQueryPathWalk::takeEachKept(size_t index, std::span<NSXMLNode* const> node
 
 // Whether nothing is asked of what this walk finds but its number, and no other walk of the step
 // finds the same: from one node, children of children lie beside each other.
-bool XQueryPathWalk::countsInIndex(size_t index, int axis) const {
+bool XQueryPathWalk::onlyCounts(size_t index, int axis) const {
   const bool goesDown = axis == XQueryAxisDescendant || axis == XQueryAxisAttributesBelow;
   const XQueryWalkedStep& step = _steps[index];
   if (!goesDown || index + 1 != _steps.size() || step.hasPredicates()) return false;
@@ -345,12 +342,8 @@ void XQueryPathWalk::stream(size_t index, int axis, NSXMLNode* node) {
   XQueryStepTest test(_steps[index], *this);
   const NSXMLExpandedName* const name = test.onlyName();
   const bool isNamed = name || test.onlyNames();
-  if (isNamed && countsInIndex(index, axis)) {
-    if (name) {
-      XQueryWalkAnyAxis(node, axis, false, CountVisit(name, results, context));
-    } else {
-      XQueryWalkAnyAxis(node, axis, false, CountChoiceVisit(test, results, context));
-    }
+  if ((isNamed || !_steps[index].testMayRaise) && onlyCounts(index, axis)) {
+    count(_steps[index], axis, node);
   } else if (name) {
     streamMatching(index, axis, node, [name](auto act) { return XQueryNamedVisit(name, act); });
   } else if (test.onlyNames()) {
@@ -359,6 +352,17 @@ void XQueryPathWalk::stream(size_t index, int axis, NSXMLNode* node) {
     streamMatching(index, axis, node, [&test](auto act) {
       return [&test, act](NSXMLNode* found) { return !test.matches(found) || act(found); };
     });
+  }
+}
+
+void XQueryPathWalk::count(const XQueryWalkedStep& step, int axis, NSXMLNode* node) {
+  XQueryStepTest test(step, *this);
+  if (test.onlyName()) {
+    XQueryWalkAnyAxis(node, axis, false, CountNamedVisit(test, results));
+  } else if (test.onlyNames()) {
+    XQueryWalkAnyAxis(node, axis, false, CountChoiceVisit(test, results));
+  } else {
+    XQueryWalkAnyAxis(node, axis, false, CountVisit(test, results));
   }
 }
 

@@ -23,9 +23,9 @@
 //                 descendants named a are counted by their parents, which come in document order.
 //   lookup        Where a predicate asks for a value that the index of the tree has, the step takes
 //                 the nodes with that value in place of walking (XQueryValueLookup).
-//   countsInIndex Where nothing but the number of all nodes of some names below a node is wanted,
-//   it
-//                 is that of stretches of the index, whose nodes are not looked at.
+//   onlyCounts    Where nothing but the number of all nodes below a node is wanted that a step
+//                 finds, none is kept. Of some names it is that of stretches of the index, whose
+//                 nodes are not looked at.
 //   filtersEach   Where only some of the nodes are wanted, or their number, a step filters each
 //                 node as it finds it and hands it on, so that the walk ends as soon as the answer
 //                 is certain.
@@ -97,7 +97,8 @@ class XQueryPathWalk : public XQueryPathRun {
                        std::vector<NSXMLNode*>& nodes);
   void collectFromBack(const XQueryWalkedStep& step, const NSXMLNode* node,
                        std::vector<NSXMLNode*>& nodes);
-  bool countsInIndex(size_t index, int axis) const;
+  bool onlyCounts(size_t index, int axis) const;
+  void count(const XQueryWalkedStep& step, int axis, NSXMLNode* node);
   bool filtersEach(const XQueryWalkedStep& step) const;
   bool keepsAlone(const XQueryWalkedStep& step, size_t firstPredicate, NSXMLNode* node);
   bool filterNodes(const XQueryWalkedStep& step, size_t fromIndex, std::vector<NSXMLNode*>& nodes);
