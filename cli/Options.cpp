@@ -23,7 +23,8 @@ constexpr const char* footer =
     "several INPUTs, or a folder of them, the query is evaluated for each on its own.\n\n"
     "Exit status: 0 for a result, 1 for an error in the query, 2 for wrong usage, 3 for input "
     "that\n"
-    "cannot be read or parsed or output that cannot be written.";
+    "cannot be read or parsed or output that cannot be written, 4 with --exit-status for a result\n"
+    "that is empty or false.";
 
 // The usage line of the two forms; the rest is the library's.
 class Help : public CLI::Formatter {

@@ -17,6 +17,7 @@ if(TARGET xquery-command)
           DESTINATION "${CMAKE_INSTALL_DATADIR}/zsh/site-functions")
   install(FILES "${completions}/xquery.fish"
           DESTINATION "${CMAKE_INSTALL_DATADIR}/fish/vendor_completions.d")
+  install(FILES "${PROJECT_BINARY_DIR}/xquery.1" DESTINATION "${CMAKE_INSTALL_MANDIR}/man1")
 endif()
 
 install(FILES "${PROJECT_SOURCE_DIR}/LICENSE" DESTINATION "${CMAKE_INSTALL_DOCDIR}")

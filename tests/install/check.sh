@@ -31,6 +31,15 @@ case $way in
   command)
     actual=$("$work/prefix/bin/xquery" -e '//book[price > 10]/title/text()' "$books")
     expected=$'A Field Guide to Lichens\nBrücken &amp; Wege'
+    # The manual page and the completions know every option that the help knows.
+    for option in $("$work/prefix/bin/xquery" --help | grep -oE '^ +(-.,)?--[a-z-]+' |
+      grep -oE -- '--.*'); do
+      for file in man/man1/xquery.1 bash-completion/completions/xquery \
+        zsh/site-functions/_xquery fish/vendor_completions.d/xquery.fish; do
+        sed 's/\\//g' "$work/prefix/share/$file" | grep -qF -- "${option#--}" ||
+          { echo "$file does not name $option" >&2; exit 1; }
+      done
+    done
     ;;
 esac
 [ "$actual" = "$expected" ] || { echo "unexpected output: $actual" >&2; exit 1; }
