@@ -30,6 +30,8 @@ const Row rows[] = {
     row(XQueryErrors::memoryCeilingReached, 0, "limit: memory ceiling reached"),
     row(XQueryErrors::tooManyDigits, 0, "limit: number of too many digits"),
     row(XQueryErrors::rangeTooLong, 0, "limit: range of too many items"),
+    row(XQueryErrors::notAStream, 0, "cannot be evaluated as a stream: %@"),
+    row(XQueryErrors::nodeOfAStreamKept, 0, "a node of a stream is still referred to"),
     row(XQueryErrors::unresolvedQName, 1, "can't resolve QName for \"%@\""),
     row(XQueryErrors::noSource, 3, "there is no query text"),
     row(XQueryErrors::notUTF8, 3, "the query is not well-formed UTF-8"),
