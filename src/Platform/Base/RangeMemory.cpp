@@ -26,20 +26,21 @@ constexpr size_t mostBytesKept = size_t{256} << 10;  // of each size
 RangeRuns& runs() {
   // Never destroyed: trees may be freed by destructors that run at exit.
   alignas(RangeRuns) static unsigned char storage[sizeof(RangeRuns)];
-  static RangeRuns* const shared = [] {
-    auto* const made = ::new (storage) RangeRuns(RangeRuns::windowBytes);
-    // A child process must not find it locked by a thread that it does not have. Who waits for
-    // others to free values waits before it is locked for them.
-    const auto prepare = [] {
-      waitForAbandonedValues();
-      runs().lock();
-    };
-    const auto goOn = [] { runs().unlock(); };
-    ::pthread_atfork(prepare, goOn, goOn);
-    return made;
-  }();
+  static RangeRuns* const shared = ::new (storage) RangeRuns(RangeRuns::windowBytes);
   return *shared;
 }
+
+// A child process must not find it locked, or half made, by a thread that it does not have. Whoever
+// loads the library uses it from no other thread yet. Who waits for others to free values waits
+// before it is locked for them.
+[[maybe_unused]] const int handlersOfFork = [] {
+  const auto prepare = [] {
+    waitForAbandonedValues();
+    runs().lock();
+  };
+  const auto goOn = [] { runs().unlock(); };
+  return ::pthread_atfork(prepare, goOn, goOn);
+}();
 
 struct BlockList {
   RangeRuns::Block* first = nullptr;
