@@ -33,9 +33,9 @@ std::string forBash() {
     if (row.offers == Offers::Words) {
       action = "COMPREPLY=($(compgen -W '" + joined(words(row)) + "' -- \"$word\")); return";
     } else if (row.offers == Offers::Files) {
-      action = "COMPREPLY=($(compgen -f -- \"${word#*=}\")); return";
+      action = "mapfile -t COMPREPLY < <(compgen -f -- \"${word#*=}\"); return";
     } else if (row.offers == Offers::Folders) {
-      action = "COMPREPLY=($(compgen -d -- \"$word\")); return";
+      action = "mapfile -t COMPREPLY < <(compgen -d -- \"$word\"); return";
     }
     cases += std::string("    ") + row.name + ") " + action + " ;;\n";
   }
@@ -50,7 +50,7 @@ std::string forBash() {
          names +
          "' -- \"$word\"))\n"
          "  else\n"
-         "    COMPREPLY=($(compgen -f -- \"$word\"))\n"
+         "    mapfile -t COMPREPLY < <(compgen -f -- \"$word\")\n"
          "  fi\n"
          "}\n"
          "complete -o filenames -F _xquery xquery\n";

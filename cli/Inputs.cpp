@@ -57,7 +57,7 @@ void addFolder(const Options& options, const std::string& folder, std::vector<In
     for (const fs::directory_entry& entry : entriesOf(next, error)) {
       if (entry.is_directory(unknown)) {
         if (!entry.is_symlink(unknown)) below.push_back(entry.path());
-      } else if (isWanted(entry, options.html)) {
+      } else if (entry.is_regular_file(unknown) && isWanted(entry, options.html)) {
         inputs.push_back({entry.path().string(), {}});
       }
     }

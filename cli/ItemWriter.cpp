@@ -149,7 +149,8 @@ void ItemWriter::writeJSONItem(const NSObject& item) {
     if (!node->URIView().isEmpty()) {
       _result.append(",\"namespace\":" + jsonString(node->URIView().utf8()));
     }
-    _result.append(",\"place\":" + jsonString(_places.place(*node)));
+    // Of a stream nobody knows what was beside the node.
+    if (!_options.stream) _result.append(",\"place\":" + jsonString(_places.place(*node)));
     if (node->kind() == Kind::Element || node->kind() == Kind::Document) {
       std::string xml;
       const auto gather = [&xml](std::string_view piece) {

@@ -107,7 +107,8 @@ void Jobs::makePart(size_t number, Phases& phases) {
       return true;
     });
   } catch (const Failure& failure) {
-    if (interruption()->load()) return _results.stop();
+    // Others may read or write meanwhile, for as long as they like.
+    endIfInterrupted();
     part.end(failure.status, reported(input, failure));
   } catch (const std::exception& error) {
     part.end(StatusInput,

@@ -78,7 +78,6 @@ void declareOptions(CLI::App& app) {
   addTexts(app, "--completions", "")->group("");
   addTexts(app, "arguments", "")
       ->expected(0, CLI::detail::expected_max_vector_size)
-      ->allow_extra_args()
       ->take_all()
       ->group("");
 }

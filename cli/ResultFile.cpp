@@ -1,6 +1,6 @@
 #include "ResultFile.h"
 
-#include "Signals.h"
+#include "Streams.h"
 
 #include <cerrno>
 #include <cstdio>
@@ -47,7 +47,7 @@ ResultFile::~ResultFile() {
   if (_isOwned && _file >= 0) close(_file);
   if (_temporary.empty()) return;
   unlink(_temporary.c_str());
-  removeAtInterrupt({});
+  removeAtEnd({});
 }
 
 int ResultFile::open(const std::string& path) {
@@ -93,7 +93,7 @@ bool ResultFile::openBeside(const std::string& target, const struct stat* old) {
     return fail(old ? "no new file can be made beside it: " : "");
   }
   _target = target;
-  removeAtInterrupt(_temporary);
+  removeAtEnd(_temporary);
   if (old) inheritFrom(*old);
   return true;
 }
@@ -111,7 +111,7 @@ bool ResultFile::finish() {
   if (_isOwned && file >= 0 && close(file) != 0) return fail();
   if (_temporary.empty()) return true;
   if (std::rename(_temporary.c_str(), _target.c_str()) != 0) return fail();
-  removeAtInterrupt({});
+  removeAtEnd({});
   _temporary.clear();
   return true;
 }

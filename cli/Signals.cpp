@@ -2,29 +2,22 @@
 
 #include "Streams.h"
 
+#include <cerrno>
 #include <csignal>
-#include <cstring>
-#include <limits.h>
-#include <unistd.h>
 
 namespace cli {
 namespace {
 
 std::atomic<bool>* raised = nullptr;
 std::atomic<int> underWay = 0;
-char temporary[PATH_MAX];
-std::atomic<bool> hasTemporary = false;
 
 static_assert(std::atomic<bool>::is_always_lock_free && std::atomic<int>::is_always_lock_free);
 
-[[noreturn]] void end(int signal) {
-  if (hasTemporary) unlink(temporary);
-  endBySignal(signal);
-}
-
 void handle(int signal) {
   const int error = errno;
-  if (signal != SIGINT || underWay == 0 || raised->exchange(true)) end(signal);
+  if (signal != SIGINT || underWay == 0 || raised->exchange(true)) {
+    endBySignal(signal);
+  }
   errno = error;
 }
 
@@ -32,7 +25,7 @@ void handle(int signal) {
 
 void handleSignals() {
   raised = interruption().get();
-  for (const int signal : {SIGINT, SIGTERM, SIGHUP}) {
+  for (const int signal : {SIGINT, SIGTERM, SIGHUP, SIGQUIT, SIGXCPU}) {
     struct sigaction action {};
     if (sigaction(signal, nullptr, &action) != 0 || action.sa_handler == SIG_IGN) continue;
     action = {};
@@ -55,15 +48,8 @@ UnderWay::~UnderWay() {
   --underWay;
 }
 
-void removeAtInterrupt(const std::string& path) {
-  hasTemporary = false;
-  if (path.empty() || path.size() >= sizeof temporary) return;
-  std::memcpy(temporary, path.c_str(), path.size() + 1);
-  hasTemporary = true;
-}
-
 void endIfInterrupted() {
-  if (interruption()->load()) end(SIGINT);
+  if (interruption()->load()) endBySignal(SIGINT);
 }
 
 }  // namespace cli

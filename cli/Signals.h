@@ -6,7 +6,6 @@
 
 #include <atomic>
 #include <memory>
-#include <string>
 
 namespace cli {
 
@@ -24,9 +23,6 @@ class UnderWay {
   UnderWay(const UnderWay&) = delete;
   UnderWay& operator=(const UnderWay&) = delete;
 };
-
-// The file that must not be left behind; an empty path for none.
-void removeAtInterrupt(const std::string& path);
 
 // Ends the process as the interrupt that there was does, where there was one.
 void endIfInterrupted();

@@ -1,13 +1,22 @@
 #include "Streams.h"
 
+#include <atomic>
 #include <cerrno>
 #include <csignal>
+#include <cstring>
 #include <fcntl.h>
+#include <limits.h>
 #include <poll.h>
 #include <pthread.h>
 #include <unistd.h>
 
 namespace cli {
+namespace {
+
+char temporary[PATH_MAX];
+std::atomic<bool> hasTemporary = false;
+
+}  // namespace
 
 void prepareStandardStreams() {
   for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
@@ -20,11 +29,19 @@ void prepareStandardStreams() {
   std::signal(SIGXFSZ, SIG_IGN);
 }
 
+void removeAtEnd(const std::string& path) {
+  hasTemporary = false;
+  if (path.empty() || path.size() >= sizeof temporary) return;
+  std::memcpy(temporary, path.c_str(), path.size() + 1);
+  hasTemporary = true;
+}
+
 void endOfClosedPipe() {
   endBySignal(SIGPIPE);
 }
 
 void endBySignal(int signal) {
+  if (hasTemporary) unlink(temporary);
   std::signal(signal, SIG_DFL);
   sigset_t one;
   sigemptyset(&one);

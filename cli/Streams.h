@@ -1,6 +1,7 @@
 // The standard streams of the command.
 #pragma once
 
+#include <string>
 #include <string_view>
 
 namespace cli {
@@ -17,6 +18,9 @@ void prepareStandardStreams();
 // Ends the process as the signal of a closed pipe does, which is what a shell expects of a command
 // whose reader had enough; without a message.
 [[noreturn]] void endOfClosedPipe();
+
+// The file that must not be left behind by a process that ends so; an empty path for none.
+void removeAtEnd(const std::string& path);
 
 // Ends the process as the signal does that nobody handles; also from within its handler.
 [[noreturn]] void endBySignal(int signal);

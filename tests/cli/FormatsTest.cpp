@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 using command::Outcome;
+using command::shell;
 using command::TemporaryDirectory;
 using command::xquery;
 using testing::HasSubstr;
@@ -73,6 +74,14 @@ TEST(Formats, IndentationChangesNoText) {
   EXPECT_EQ(written({"--indent"}, "<x> <y xml:space='preserve'><z/>{' '}</y> <w/></x>"),
             "<x>\n  <y xml:space=\"preserve\"><z/> </y>\n  <w/>\n</x>\n");
   EXPECT_THAT(written({"--indent"}, "/"), HasSubstr("?>\n<a x=\"1\">\n  <b>"));
+}
+
+TEST(Formats, IndentationDoesNotGrowWithoutBound) {
+  const Outcome outcome = shell(
+      "\"$0\" --indent -e "
+      "'declare function local:f($n) { if ($n = 0) then () else <a>{local:f($n - 1)}</a> }; "
+      "local:f(2000)' | wc -c");
+  EXPECT_LT(std::stoi(outcome.out), 2 * 2000 * (200 + 5));
 }
 
 TEST(Formats, ASeparatorStandsBetweenItemsOnly) {

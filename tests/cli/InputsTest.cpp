@@ -45,6 +45,26 @@ TEST_F(Inputs, AreAskedOneAfterTheOther) {
   EXPECT_EQ(xquery({"--types", "--with-name", "-e", "1"}).out, "\txs:integer\t1\n");
 }
 
+TEST_F(Inputs, AreNamedByAnyCharacters) {
+  const std::string folder = path("");
+  write("[k,l]", 1);
+  write("[a.xml]", 2);
+  write("-e", 3);
+  const Outcome outcome =
+      shell("cd \"$1\" && \"$0\" -e '//text()' '[k,l]' '[a.xml]' -- -e", {folder});
+  EXPECT_EQ(outcome.out, "1\n2\n3\n");
+  EXPECT_EQ(outcome.err, "");
+}
+
+// Reading from a pipe would wait for a writer.
+TEST_F(Inputs, OfAFolderAreFilesOnly) {
+  makeFolder("in");
+  write("in/a.xml", 1);
+  const Outcome outcome = shell("mkfifo \"$1/b.xml\" && \"$0\" -e '//text()' \"$1\"", {path("in")});
+  EXPECT_EQ(outcome.out, "1\n");
+  EXPECT_EQ(outcome.status, 0);
+}
+
 TEST_F(Inputs, OfAFolderAreItsDocumentsAndThoseBelow) {
   makeFolder("in/deep/er");
   makeFolder("in/.hidden");

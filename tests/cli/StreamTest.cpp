@@ -31,6 +31,13 @@ TEST(StreamCommand, WritesWhatIsWrittenWithoutIt) {
   }
 }
 
+// What was beside a node is not there any more.
+TEST(StreamCommand, TellsNoPlacesOfNodes) {
+  const Outcome outcome = xquery({"--stream", "--as", "json", "-e", "/a/b[c = 2]/c", "-"}, text);
+  EXPECT_THAT(outcome.out, HasSubstr("\"name\":\"c\""));
+  EXPECT_THAT(outcome.out, testing::Not(HasSubstr("place")));
+}
+
 TEST(StreamCommand, IsGivenVariablesNamespacesAndOptions) {
   const Outcome outcome = xquery({"--stream", "--var", "n=2", "--namespace", "p=u", "-e",
                                   "declare variable $n external; /p:a/p:b[. = $n]/text()", "-"},

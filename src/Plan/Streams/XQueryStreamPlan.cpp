@@ -8,6 +8,8 @@
 #include "Functions/XQueryBuiltInFunction.h"
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Rules/PlaceInside.h"
+#include "Prolog/XQueryProlog.h"
+#include "Types/XQueryNumber.h"
 
 #include <optional>
 #include <utility>
@@ -79,8 +81,15 @@ class Analysis {
   // Globals are evaluated before the first record is read.
   void checkGlobals() const {
     for (const XQueryProgramBody& body : _program.bodies()) {
-      if (body.variable && _facts[body.place].does(XQueryDeeds::ReadsFocus)) {
+      if (!body.variable) continue;
+      const XQueryFacts& facts = _facts[body.place];
+      if (facts.does(XQueryDeeds::ReadsFocus)) {
         refuse(body.place, "a global variable reads the document");
+      }
+      // The first result is given its base URI, which is not to be seen in copies made after it.
+      const bool hasBase = body.prolog && body.prolog->baseURI();
+      if (hasBase && facts.does(XQueryDeeds::MakesNodes)) {
+        refuse(body.place, "a global variable makes nodes that have a base URI");
       }
     }
   }
@@ -123,8 +132,16 @@ class Analysis {
     refuse(place, "the function needs the whole of its argument");
   }
 
+  // Of an integer that is written there. What is no integer, or too large for a double, is rounded
+  // by the function in a way of its own.
   std::optional<uint64_t> literalAt(XQueryPlaceID place) const {
-    return XQueryStep::literalPositionOf(exprAt(inside(place)));
+    constexpr uint64_t most = uint64_t{1} << 53;
+    const XQueryExpr* const expr = exprAt(inside(place));
+    const auto* literal = dyn_cast<XQueryLiteral>(expr);
+    const auto* number = literal ? dyn_cast<XQueryNumber>(literal->literalValue().get()) : nullptr;
+    const auto position = XQueryStep::literalPositionOf(expr);
+    const bool isInteger = number && number->typeID() == XQueryTypeInteger;
+    return isInteger && position && *position <= most ? position : std::nullopt;
   }
 
   void takeSubsequence(XQueryPlaceID first, size_t count) {
@@ -329,6 +346,9 @@ class Analysis {
     if (_isAnywhere || levelOfRecord() > levelsThatHoldDescendants) {
       refuse(path, "the descendant axis may lead out of its node");
     }
+    // What is found then comes parent by parent.
+    if (!_program[path].isOrdered)
+      refuse(path, "\"//\" is not in document order where it is unordered");
     _isAnywhere = true;
   }
 

@@ -281,9 +281,11 @@ void Serializer::run() {
   _out.flush();
 }
 
+// What nobody reads would grow with the square of the depth.
 void Serializer::startLine(size_t depth) {
+  constexpr size_t deepest = 100;
   _out.write('\n');
-  for (size_t level = 0; level < depth; ++level) _out.write("  ");
+  for (size_t level = 0; level < std::min(depth, deepest); ++level) _out.write("  ");
 }
 
 // Nothing stands before the document's first child, whose declaration ends with a line feed.
