@@ -12,6 +12,8 @@
 #include <algorithm>
 #include <memory>
 #include <sstream>
+#include <string_view>
+#include <utility>
 
 namespace cli {
 namespace {
@@ -78,13 +80,36 @@ void declareOptions(CLI::App& app) {
   addTexts(app, "--completions", "")->group("");
   addTexts(app, "arguments", "")
       ->expected(0, CLI::detail::expected_max_vector_size)
+      ->allow_extra_args()
       ->take_all()
       ->group("");
 }
 
+// The library splits what stands in brackets at its commas, file names too. With this in front of
+// them it does not.
+constexpr char bracketMark = '\1';
+
+void parse(CLI::App& app, int argc, char** argv) {
+  std::vector<std::string> arguments;  // the last one first
+  for (int index = argc - 1; index > 0; --index) {
+    const std::string_view argument = argv[index];
+    const bool isInBrackets = argument.starts_with('[');
+    arguments.push_back((isInBrackets ? std::string(1, bracketMark) : "") + std::string(argument));
+  }
+  app.parse(std::move(arguments));
+}
+
+std::vector<std::string> given(const CLI::App& app, const char* name) {
+  std::vector<std::string> values = app.get_option(name)->results();
+  for (std::string& value : values) {
+    if (value.starts_with(std::string{bracketMark, '['})) value.erase(0, 1);
+  }
+  return values;
+}
+
 void applyOptions(const CLI::App& app, Options& options) {
   for (const OptionRow& row : optionRows()) {
-    for (const std::string& value : app.get_option(row.name)->results()) {
+    for (const std::string& value : given(app, row.name)) {
       if (row.takes == Takes::Nothing && value != "true") {
         throw WrongUsage(std::string(row.name) + " takes no value");
       }
@@ -95,7 +120,7 @@ void applyOptions(const CLI::App& app, Options& options) {
 
 // Gives the positional arguments their meaning.
 void interpretArguments(const CLI::App& app, Options& options) {
-  options.inputs = app.get_option("arguments")->results();
+  options.inputs = given(app, "arguments");
   if (options.queryText) return;
   if (options.inputs.empty()) throw WrongUsage("QUERYFILE or -e QUERY is required");
   options.queryFile = options.inputs.front();
@@ -200,7 +225,7 @@ std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
   CLI::App app("Evaluates an XQuery and writes each item of the result on a line of its own.");
   declareOptions(app);
   try {
-    app.parse(argc, argv);
+    parse(app, argc, argv);
     applyOptions(app, options);
     const std::vector<std::string>& shell = app.get_option("--completions")->results();
     if (!shell.empty()) return printCompletions(shell.front());
