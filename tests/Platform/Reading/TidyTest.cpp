@@ -1,5 +1,6 @@
 // HTML, tidied and then parsed like any document.
 #include "Platform/Base/ProcessorTime.h"
+#include "Platform/Base/SanitizedSizes.h"
 #include "Platform/Base/ThreadTestSupport.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Loading/LoadingTestSupport.h"
@@ -213,10 +214,11 @@ TEST(TidyHostile, AReadingThatComesToNoEndIsLeftBehind) {
 }
 
 TEST(TidyHostile, LongTextsAreRead) {
-  EXPECT_EQ(outcome("<p>" + std::string(20'000'000, 'x')), "document");
+  EXPECT_EQ(outcome("<p>" + std::string(20'000'000 / largeInputDivisor, 'x')), "document");
   EXPECT_EQ(outcome("<p title='" + std::string(5'000'000, 'x') + "'>y"), "document");
   EXPECT_EQ(outcome("<!--" + std::string(5'000'000, '-') + ">x"), "document");
-  EXPECT_EQ(outcome(repeated("<p>hello <b>world</b></p>\n", 100'000)), "document");
+  EXPECT_EQ(outcome(repeated("<p>hello <b>world</b></p>\n", 100'000 / largeInputDivisor)),
+            "document");
 }
 
 TEST(TidyHostile, WhateverIsReadIsWellFormed) {
@@ -311,9 +313,9 @@ TEST(TidyHostile, AReadingThatIsNotWaitedForEnds) {
 
 TEST(TidyHostile, WhatLibtidyTakesCountsAsValues) {
   waitForTheLastThread();
-  const std::string HTML = repeated("<i></i>", 200'000);
+  const std::string HTML = repeated("<i></i>", 200'000 / largeInputDivisor);
   const int64_t before = workMeter.valueBytes;
-  workMeter.mostValueBytes = before + (int64_t{16} << 20);
+  workMeter.mostValueBytes = before + (int64_t{16} << 20) / largeInputDivisor;
   std::string failure;
   EXPECT_THROW((void)XHTMLFromHTML(HTML, failure), std::bad_alloc);
   EXPECT_TRUE(workMeter.wasRefused);
