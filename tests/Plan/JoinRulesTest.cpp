@@ -386,6 +386,10 @@ TEST(Sets, AnswerForManyItems) {
            "let $v := (1 to 30) return //p[@n = $v]",
            "let $v := //b/@p return //p[$v = @nothing]",
            "let $v := (//p/@n, xs:date('2004-01-01')) return //p[@n = $v]",
+           "let $v := (1 to 100) return for $p in //p return count($p/@nothing = $v)",
+           "let $v := (1 to 100) return for $p in //p return count($v = $p/@nothing)",
+           "let $v := (1 to 100, xs:date('2004-01-01')) return //p[count(@nothing = $v) = 0]/@id",
+           "let $v := ((1 to 99), 'x') return for $p in //p return count($v > $p/@nothing)",
        }) {
     EXPECT_EQ(setsIn(text), 1U) << text;
     resultOf(text);

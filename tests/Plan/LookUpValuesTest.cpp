@@ -258,11 +258,34 @@ TEST(LookUpValues, FindsWhatWalkingFinds) {
   }
 }
 
-TEST(LookUpValues, LeaveToWalkingWhatIsNoSingleText) {
-  for (const char* probe :
-       {"'e7'", "7", "7.0", "()", "('e7', 'e8')", "xs:anyURI('e7')", "xs:date('2004-05-06')",
-        "true()", "/r/e[8]/@id", "//e[@id = 'e6']/@id", "data(/r/e[8]/@id)", "error()",
-        "xs:integer('x')", "exactly-one(//none)", "''", "xs:QName('e7')"}) {
+TEST(LookUpValues, FindTextsAndLeaveOtherValuesToWalking) {
+  for (const char* probe : {"'e7'",
+                            "7",
+                            "7.0",
+                            "()",
+                            "('e7', 'e8')",
+                            "xs:anyURI('e7')",
+                            "xs:date('2004-05-06')",
+                            "true()",
+                            "/r/e[8]/@id",
+                            "//e[@id = 'e6']/@id",
+                            "data(/r/e[8]/@id)",
+                            "error()",
+                            "xs:integer('x')",
+                            "exactly-one(//none)",
+                            "''",
+                            "xs:QName('e7')",
+                            "('e9', 'e8', 'e9', 'no')",
+                            "('k3', 'k1')",
+                            "('k1', '')",
+                            "('e7', 8)",
+                            "(8, 'e7')",
+                            "('e7', error())",
+                            "('e7', xs:date('2004-05-06'))",
+                            "/r/e[@n = '3']/@id",
+                            "//e[@n = '3']/k",
+                            "(//k, 'k3')",
+                            "('e7', <a>e8</a>)"}) {
     for (const char* key : {"@id", "@n", "k", "v", "."}) {
       resultOf("/r/e[" + std::string(key) + " = " + probe + "]/@id");
       resultOf("//e[" + std::string(probe) + " eq " + key + "]/@id");
@@ -303,8 +326,9 @@ TEST(LookUpValues, AgreeWithWalkingOverGeneratedQueries) {
   RandomChoices random(20041029);
   const std::vector<std::string> keys = {"@id", "@n",  "k", "e/@id", "s/@x",
                                          "k/b", "e/k", ".", "./k",   "e//k"};
-  const std::vector<std::string> probes = {"'e3'",       "'3'", "'k3'",       "'a'",  "'k10'", "$p",
-                                           "string($p)", "3",   "($p, 'e4')", "'10'", "'k10a'"};
+  const std::vector<std::string> probes = {
+      "'e3'",       "'3'",  "'k3'",   "'a'",  "'k10'",           "$p", "string($p)", "3",
+      "($p, 'e4')", "'10'", "'k10a'", "$p/k", "('k3', 'e9', $p)"};
   const std::vector<std::string> others = {"", "[s]", "[not(k)]", "[@n < 20]", "[count(k) > 1]"};
   for (int i = 0; i < 80; ++i) {
     const std::string key = random.oneOf(keys), probe = random.oneOf(probes);

@@ -99,6 +99,8 @@ class XQueryJoinTable final : public XQueryKeptValue {
   bool isIrregular(uint32_t position) const {
     return std::binary_search(_irregular.begin(), _irregular.end(), position);
   }
+  // Whether no item has to be asked whatever it is compared with.
+  bool isRegular() const { return _irregular.empty(); }
   // Whether no other item has to be asked because of what it is compared with.
   bool isRegularFor(const Question& question) const;
   // Whether each item has one key at most, and none has to be asked.

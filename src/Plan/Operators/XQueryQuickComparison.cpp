@@ -69,20 +69,26 @@ Value compareTypedNumbers(XQueryRelation relation, const NSObject* left, const N
   return NSNumber::numberWithBool(relation.holds(a->compare(*b)));
 }
 
+// Whether every item is one that atomizing accepts as it stands.
+bool arePossible(const XQueryItemList& items) {
+  WorkPacer pacer;
+  for (size_t index = 0; index < items.count(); ++index) {
+    pacer.turn();
+    if (!XQueryComparand::isPossible(items[index])) return false;
+  }
+  return true;
+}
+
 // An operand of any number of items.
 class Side {
  public:
-  // Whether every item is one that atomizing accepts as it stands.
-  bool read(const Value& operand) {
-    const XQueryItemList items(operand.get());
+  explicit Side(const XQueryItemList& items) {
     _items.reserve(items.count());
     WorkPacer pacer;
     for (size_t index = 0; index < items.count(); ++index) {
       pacer.turn();
-      if (!XQueryComparand::isPossible(items[index])) return false;
       _items.emplace_back(items[index]);
     }
-    return true;
   }
 
   size_t count() const { return _items.size(); }
@@ -132,6 +138,20 @@ Value comparePair(int code, XQueryComparand& a, XQueryComparand& b, XQueryContex
   const Value x = a.valueAs(targets.left, context);
   const Value y = b.valueAs(targets.right, context);
   return XQueryOperatorExpr::compareValue(x, y, code, context);
+}
+
+// Most lists are compared with one item: they are looked at where they are.
+Value compareWithEach(int code, const XQueryItemList& left, const XQueryItemList& right,
+                      XQueryContext& context) {
+  const bool isLeft = left.count() == 1;
+  const XQueryItemList& others = isLeft ? right : left;
+  XQueryComparand one(isLeft ? left[0] : right[0]);
+  for (size_t index = 0; index < others.count(); ++index) {
+    XQueryComparand other(others[index]);
+    Value answer = comparePair(code, isLeft ? one : other, isLeft ? other : one, context);
+    if (!(answer.get() == NSNumber::falseValue())) return answer;
+  }
+  return NSNumber::falseValue();
 }
 
 // --- many pairs ----------------------------------------------------------------------------------
@@ -249,11 +269,17 @@ Value XQueryQuickGeneralComparison(int type, const Value& left, const Value& rig
     XQueryComparand b(right.get());
     return comparePair(code, a, b, context);
   }
-  Side leftSide;
-  Side rightSide;
-  if (!leftSide.read(left) || !rightSide.read(right)) return Value();
-  if (leftSide.count() == 0 || rightSide.count() == 0) return NSNull::null();
-  if (leftSide.count() >= manyPairs / rightSide.count()) {
+  const XQueryItemList leftItems(left.get());
+  const XQueryItemList rightItems(right.get());
+  if (!arePossible(leftItems) || !arePossible(rightItems)) return Value();
+  if (leftItems.count() == 0 || rightItems.count() == 0) return NSNull::null();
+  const bool areMany = leftItems.count() >= manyPairs / rightItems.count();
+  if (!areMany && (leftItems.count() == 1 || rightItems.count() == 1)) {
+    return compareWithEach(code, leftItems, rightItems, context);
+  }
+  Side leftSide(leftItems);
+  Side rightSide(rightItems);
+  if (areMany) {
     const Answer answer = compareManyPairs(relation, leftSide, rightSide);
     if (answer != Answer::Unknown) return NSNumber::numberWithBool(answer == Answer::Yes);
   }

@@ -1,12 +1,15 @@
 // Nobody can tell: pairs are compared in an order of which nothing is left to see, unless one of
 // them is an error. A set takes text, or else numbers, and a probe that it can answer: then no pair
-// is. Everything else is compared as it was written, and so is everything with diagnostics on.
+// is. Nothing is compared with a list without items, but each of the other items has to be one that
+// can be compared, which those of a set are. Everything else is compared as it was written, and so
+// is everything with diagnostics on.
 #include "Plan/Operators/XQuerySetComparison.h"
 
 #include "Context/KeptValues.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
+#include "xquery/Collection.h"
 #include "xquery/Number.h"
 
 #include <array>
@@ -18,7 +21,7 @@ namespace xquery {
 namespace {
 
 // So few are compared as quickly as looked up.
-constexpr size_t fewPairs = 64;
+constexpr size_t fewPairs = 8;
 // A set that is used but once is worth its making.
 constexpr size_t manyPairs = size_t{1} << 14;
 
@@ -47,10 +50,12 @@ Value XQuerySetComparison::computeValue(XQueryContext& context) const {
   const size_t leftCount = XQueryItemList(left.get()).count();
   const size_t rightCount = XQueryItemList(right.get()).count();
   const size_t pairs = leftCount * rightCount;
-  if (pairs <= fewPairs || context._internal().showsErrors())
+  const size_t work = pairs ? pairs : leftCount + rightCount;
+  if (work <= fewPairs || context._internal().showsErrors())
     return _comparison.answerFor(left, right, context);
   const bool setIsLeft = leftCount > rightCount;
-  const auto set = setOf(setIsLeft ? left : right, setIsLeft, pairs >= manyPairs, context);
+  const auto set = setOf(setIsLeft ? left : right, setIsLeft, work >= manyPairs, context);
+  if (pairs == 0 && left && right && set && set->isRegular()) return NSNull::null();
   const auto areMet = set ? set->meets(setIsLeft ? right : left) : std::nullopt;
   if (!areMet) return _comparison.answerFor(left, right, context);
   return NSNumber::numberWithBool(*areMet);

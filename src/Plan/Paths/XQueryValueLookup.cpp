@@ -53,52 +53,79 @@ bool keepChildren(const NSXMLNode* parent, std::vector<NSXMLNode*>& nodes) {
   return true;
 }
 
+bool isBefore(const NSXMLNode* a, const NSXMLNode* b) {
+  return a->orderNumber() < b->orderNumber();
+}
+
+// Each once, in document order.
+void putInOrder(std::vector<NSXMLNode*>& nodes) {
+  const auto isOutOfOrder = [](const NSXMLNode* a, const NSXMLNode* b) { return !isBefore(a, b); };
+  if (std::adjacent_find(nodes.begin(), nodes.end(), isOutOfOrder) == nodes.end()) return;
+  WorkPacer pacer;
+  std::sort(nodes.begin(), nodes.end(), [&](const NSXMLNode* a, const NSXMLNode* b) {
+    pacer.turn();
+    return isBefore(a, b);
+  });
+  nodes.erase(std::unique(nodes.begin(), nodes.end()), nodes.end());
+}
+
 }  // namespace
 
 XQueryValueLookup::XQueryValueLookup(Of of, const NSXMLExpandedName* name,
                                      const XQueryValueWay& way, Probe probe)
     : _of(of), _name(name), _way(way), _key(keyOf(of, name, way)), _probe(std::move(probe)) {}
 
-// None where walking must tell.
-std::optional<NSXMLNodeSpan> XQueryValueLookup::elementsWith(const NSXMLValueIndex& values,
-                                                             XQueryContext& context,
-                                                             const NSXMLNode* first,
-                                                             const NSXMLNode* stop) const {
+// Numbers and dates are compared with what a text means, "eq" refuses several values, and what has
+// no value is not in the index: walking must tell.
+bool XQueryValueLookup::areTexts(const XQueryItemList& probes) const {
+  if (probes.count() == 0 || (probes.count() > 1 && !_probe.takesSeveral)) return false;
+  WorkPacer pacer;
+  for (size_t index = 0; index < probes.count(); ++index) {
+    pacer.turn();
+    const XQueryJoinOperand probe(probes[index]);
+    if (!probe.isText()) return false;
+    if (_probe.meetsNoneWhenEmpty && probe.text.view().length() == 0) return false;
+  }
+  return true;
+}
+
+// False where walking must tell. The nodes of one value come in document order, unless the way
+// leads up from them.
+bool XQueryValueLookup::addNodesWith(const NSXMLValueIndex& values, const NSXMLNode* first,
+                                     const NSXMLNode* stop, XQueryStepTest& test,
+                                     XQueryContext& context,
+                                     std::vector<NSXMLNode*>& candidates) const {
   const Value value = XQueryValueOrNull(*_probe.expr, context);
-  if (!value) return std::nullopt;
-  // Numbers and dates are compared with what a text means. What any of several values is equal to
-  // would have to be merged.
+  if (!value) return false;
   const XQueryItemList probes(value.get());
-  if (probes.count() != 1) return std::nullopt;
-  const XQueryJoinOperand probe(probes[0]);
-  if (!probe.isText()) return std::nullopt;
-  const NSStringView text = probe.text.view();
-  if (_probe.meetsNoneWhenEmpty && text.length() == 0) return std::nullopt;
-  return NSXMLNameIndex::between(values.nodes(text), first, stop);
+  if (!areTexts(probes)) return false;
+  WorkPacer pacer;
+  for (size_t index = 0; index < probes.count(); ++index) {
+    pacer.turn();
+    const XQueryJoinOperand probe(probes[index]);
+    const auto found = NSXMLNameIndex::between(values.nodes(probe.text.view()), first, stop);
+    if (_of == Of::Attribute) {
+      listAttributes(found, candidates);
+    } else if (_of == Of::AnyName) {
+      climb(found, first, test, candidates);
+    } else {
+      candidates.insert(candidates.end(), found.begin(), found.end());
+    }
+  }
+  if (_of == Of::AnyName || probes.count() > 1) putInOrder(candidates);
+  return true;
 }
 
 // Nodes in document order may have starts in another one, and several the same.
 void XQueryValueLookup::climb(NSXMLNodeSpan ends, const NSXMLNode* first, XQueryStepTest& test,
                               std::vector<NSXMLNode*>& candidates) const {
-  const auto isBefore = [](const NSXMLNode* a, const NSXMLNode* b) {
-    return a->orderNumber() < b->orderNumber();
-  };
-  bool areInOrder = true;
   WorkPacer pacer;
   for (NSXMLNode* end : ends) {
     pacer.turn();
     NSXMLNode* node = _way.start(end);
     if (!node || isBefore(node, first) || !test.matches(node)) continue;
-    if (!candidates.empty() && candidates.back() == node) continue;
-    areInOrder = areInOrder && (candidates.empty() || isBefore(candidates.back(), node));
-    candidates.push_back(node);
+    if (candidates.empty() || candidates.back() != node) candidates.push_back(node);
   }
-  if (areInOrder) return;
-  std::sort(candidates.begin(), candidates.end(), [&](const NSXMLNode* a, const NSXMLNode* b) {
-    pacer.turn();
-    return isBefore(a, b);
-  });
-  candidates.erase(std::unique(candidates.begin(), candidates.end()), candidates.end());
 }
 
 void XQueryValueLookup::listAttributes(NSXMLNodeSpan owners,
@@ -118,14 +145,8 @@ bool XQueryValueLookup::find(NSXMLNode* node, int axis, XQueryStepTest& test,
   if (!range.first || range.first == range.stop || !_way.isOpen(context)) return false;
   const auto indexed = NSXMLIndexedValues::of(_key, range.first, range.stop);
   if (!indexed.values) return false;
-  const auto found = elementsWith(*indexed.values, context, range.first, range.stop);
-  if (!found) return false;
-  if (_of == Of::Attribute) {
-    listAttributes(*found, candidates);
-  } else if (_of == Of::AnyName) {
-    climb(*found, range.first, test, candidates);
-  } else {
-    candidates.assign(found->begin(), found->end());
+  if (!addNodesWith(*indexed.values, range.first, range.stop, test, context, candidates)) {
+    return false;
   }
   return axis != XQueryAxisChild || keepChildren(node, candidates);
 }

@@ -14,11 +14,11 @@
 #include "Plan/Paths/XQueryValueWay.h"
 #include "Platform/Tree/TreeIndexes.h"
 
-#include <optional>
 #include <vector>
 
 namespace xquery {
 
+class XQueryItemList;
 class XQueryStepTest;
 
 class XQueryValueLookup {
@@ -32,6 +32,8 @@ class XQueryValueLookup {
     Ref<XQueryExpr> expr;  // repeatable, does not read the focus
     // An element without a value meets the empty text.
     bool meetsNoneWhenEmpty = false;
+    // Of several values it is enough to equal one; otherwise they are an error.
+    bool takesSeveral = false;
   };
 
   // `name` is that of the elements or attributes, null for any.
@@ -46,8 +48,10 @@ class XQueryValueLookup {
   void noteAsked(const NSXMLNode* node, size_t nodes) const;
 
  private:
-  std::optional<NSXMLNodeSpan> elementsWith(const NSXMLValueIndex& values, XQueryContext& context,
-                                            const NSXMLNode* first, const NSXMLNode* stop) const;
+  bool areTexts(const XQueryItemList& probes) const;
+  bool addNodesWith(const NSXMLValueIndex& values, const NSXMLNode* first, const NSXMLNode* stop,
+                    XQueryStepTest& test, XQueryContext& context,
+                    std::vector<NSXMLNode*>& candidates) const;
   void climb(NSXMLNodeSpan ends, const NSXMLNode* first, XQueryStepTest& test,
              std::vector<NSXMLNode*>& candidates) const;
   void listAttributes(NSXMLNodeSpan owners, std::vector<NSXMLNode*>& candidates) const;

@@ -191,7 +191,7 @@ class Search {
     if (!found) return false;
     step.lookup = std::make_unique<const XQueryValueLookup>(
         target.of, target.name, found->way,
-        XQueryValueLookup::Probe{found->probe, found->meetsNoneWhenEmpty});
+        XQueryValueLookup::Probe{found->probe, found->meetsNoneWhenEmpty, found->takesSeveral});
     return true;
   }
 

@@ -114,7 +114,9 @@ class Search {
     }
     const bool takesOne = type == XQueryOperatorEq && !from.origin.errorExcludes;
     Found found = ofOperands(left, right, takesOne, from);
-    return found ? found : ofOperands(right, left, takesOne, from);
+    if (!found) found = ofOperands(right, left, takesOne, from);
+    if (found) found->takesSeveral = type == XQueryOperatorEqual;
+    return found;
   }
 
   // "count(K) > 0" and the like, which no items do not meet.

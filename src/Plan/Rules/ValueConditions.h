@@ -13,6 +13,7 @@ struct XQueryValueCondition {
   XQueryValueWay way;
   Ref<XQueryExpr> probe;            // repeatable, does not read the focus
   bool meetsNoneWhenEmpty = false;  // or where it leads to none and the probe is the empty text
+  bool takesSeveral = false;        // the probe may be several values, of which one is equal
 };
 
 // Whose values a condition asks for.
