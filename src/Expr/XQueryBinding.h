@@ -4,6 +4,7 @@
 
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryExpr.h"
+#include "Expr/XQueryItemGiver.h"
 #include "Expr/XQueryPicker.h"
 #include "xquery/Collection.h"
 #include "xquery/String.h"
@@ -42,6 +43,10 @@ class XQueryBindingExpr : public XQueryExpr {
   // where each is asked.
   const XQueryPicker* picker() const { return _picker.get(); }
   void setPicker(std::unique_ptr<const XQueryPicker> picker) { _picker = std::move(picker); }
+  // The same for who gives them one after another where not all may be asked for; null where they
+  // are listed.
+  const XQueryItemGiver* giver() const { return _giver.get(); }
+  void setGiver(std::unique_ptr<const XQueryItemGiver> giver) { _giver = std::move(giver); }
 
   // The value that the variable takes, or what a case answers.
   Value computeValue(XQueryContext& context) const override;
@@ -68,6 +73,7 @@ class XQueryBindingExpr : public XQueryExpr {
 
  private:
   std::unique_ptr<const XQueryPicker> _picker;
+  std::unique_ptr<const XQueryItemGiver> _giver;
 };
 
 }  // namespace xquery

@@ -67,6 +67,7 @@ class XQueryItemTally {
   void add(const Value& value);
   // So many values of one item each.
   void addItems(uint64_t number);
+  bool mayEndEarly() const { return _most != UINT64_MAX; }
   bool isComplete() const { return _flat >= _most && (_values > 1 || _alone >= _most); }
   uint64_t count() const { return _values == 1 ? _alone : _flat; }
 

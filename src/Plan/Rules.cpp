@@ -29,6 +29,8 @@ constexpr std::array rules = {
                XQueryCountPaths},
     XQueryRule{"first", "no more is walked or sorted than the first items that are asked for",
                XQueryTakeFirst},
+    XQueryRule{"one by one", "a clause finds no more of its items than are asked for",
+               XQueryTakeOneByOne},
     XQueryRule{"members", "whether one node is in a large set is looked up in a table",
                XQueryAskMembers},
     XQueryRule{"index-of", "where a value stands in a list is looked up in a table",

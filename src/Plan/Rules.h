@@ -37,6 +37,7 @@ void XQueryJoinSteps(XQueryPlanning& planning);
 void XQueryCountLists(XQueryPlanning& planning);
 void XQueryCountPaths(XQueryPlanning& planning);
 void XQueryTakeFirst(XQueryPlanning& planning);
+void XQueryTakeOneByOne(XQueryPlanning& planning);
 void XQueryFindPositions(XQueryPlanning& planning);
 void XQueryAskMembers(XQueryPlanning& planning);
 void XQueryFindNearbyNodes(XQueryPlanning& planning);

@@ -27,6 +27,7 @@ struct XQueryFLWORResults {
   uint64_t wanted = UINT64_MAX;  // so many items at most, without order specs
   uint64_t gathered = 0;         // of them
 
+  bool mayEndEarly() const { return wanted != UINT64_MAX || (tally && tally->mayEndEarly()); }
   bool areComplete() const { return gathered >= wanted || (tally && tally->isComplete()); }
 };
 
@@ -151,6 +152,9 @@ bool XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toRe
 
 bool XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
                                   XQueryFLWORResults& toResults, XQueryContext& withContext) const {
+  if (clause.giver() && toResults.mayEndEarly()) {
+    return evaluateGiven(clause, index, toResults, withContext);
+  }
   const bool isLast = index + 1 == _forLet.size();
   XQueryClauseItems items(clause.expr(), withContext);
   if (items.haveFailed()) return false;
@@ -161,15 +165,49 @@ bool XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
   }
   items.flatten();
   for (size_t k = 0; k < items.count(); ++k) {
-    checkWork();
-    Value item = items[k];
-    if (!isOfType(clause, item.get(), withContext)) return false;
-    setTuple(clause, std::move(item), k, withContext);
-    const bool goesOn = isLast ? processItem(toResults, withContext)
-                               : evaluateStartingAt(index + 1, toResults, withContext);
-    if (!goesOn) return false;
+    if (!evaluateItem(clause, index, items[k], k, toResults, withContext)) return false;
   }
   return true;
+}
+
+// `position` counts from 0.
+bool XQueryFLWORExpr::evaluateItem(const XQueryForExpr& clause, size_t index, Value item,
+                                   size_t position, XQueryFLWORResults& toResults,
+                                   XQueryContext& withContext) const {
+  checkWork();
+  if (!isOfType(clause, item.get(), withContext)) return false;
+  setTuple(clause, std::move(item), position, withContext);
+  return index + 1 == _forLet.size() ? processItem(toResults, withContext)
+                                     : evaluateStartingAt(index + 1, toResults, withContext);
+}
+
+// The same as for a list of the items, of which those behind the last wanted one are not found.
+bool XQueryFLWORExpr::evaluateGiven(const XQueryForExpr& clause, size_t index,
+                                    XQueryFLWORResults& toResults,
+                                    XQueryContext& withContext) const {
+  class Taking final : public XQueryItemGiver::Taker {
+   public:
+    Taking(const XQueryFLWORExpr& flwor, const XQueryForExpr& clause, size_t index,
+           XQueryFLWORResults& toResults, XQueryContext& context)
+        : _flwor(flwor), _clause(clause), _index(index), _results(toResults), _context(context) {}
+    bool goesOn = true;
+
+    bool take(Value item) override {
+      goesOn =
+          _flwor.evaluateItem(_clause, _index, std::move(item), _position++, _results, _context);
+      return goesOn;
+    }
+
+   private:
+    const XQueryFLWORExpr& _flwor;
+    const XQueryForExpr& _clause;
+    const size_t _index;
+    size_t _position = 0;
+    XQueryFLWORResults& _results;
+    XQueryContext& _context;
+  };
+  Taking taking(*this, clause, index, toResults, withContext);
+  return clause.giver()->giveItems(withContext, taking) && taking.goesOn;
 }
 
 // `position` counts from 0.

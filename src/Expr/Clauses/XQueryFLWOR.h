@@ -146,6 +146,10 @@ class XQueryFLWORExpr : public XQueryExpr {
                           XQueryContext& withContext) const;
   bool evaluateFor(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
                    XQueryContext& withContext) const;
+  bool evaluateGiven(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
+                     XQueryContext& withContext) const;
+  bool evaluateItem(const XQueryForExpr& clause, size_t index, Value item, size_t position,
+                    XQueryFLWORResults& toResults, XQueryContext& withContext) const;
   bool processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
   bool addTuple(const XQueryExpr* returned, XQueryFLWORResults& toResults,
                 XQueryContext& withContext) const;

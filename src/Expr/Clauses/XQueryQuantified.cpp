@@ -74,6 +74,7 @@ Value XQueryQuantifiedExpr::evaluatePostion(size_t index, XQueryContext& withCon
 Value XQueryQuantifiedExpr::evaluateItems(size_t clause, size_t index,
                                           XQueryContext& context) const {
   const XQueryQuantifiedExprItem& binding = *_items[clause];
+  if (binding.giver()) return evaluateGiven(clause, index, context);
   const XQueryClauseItems items(binding.expr(), context);
   if (items.haveFailed()) return {};
   XQueryPicks picks;
@@ -85,15 +86,47 @@ Value XQueryQuantifiedExpr::evaluateItems(size_t clause, size_t index,
   const Value open = undecided();
   Value answer;
   for (size_t i = 0; i < items.count(); ++i) {
-    Value item = items[i];
-    if (binding.type() && !XQueryInstanceOf(item.get(), *binding.type(), &context)) {
-      return XQueryErrors::invalidType.errorAtLine(binding.exprLine());
-    }
-    context._internal().setVariable(std::move(item), binding.varID());
-    answer = evaluatePostion(index + 1, context);
+    answer = evaluateItem(clause, index, items[i], context);
     if (answer != open) break;
   }
   return answer;
+}
+
+// The answer for one item of a clause.
+Value XQueryQuantifiedExpr::evaluateItem(size_t clause, size_t index, Value item,
+                                         XQueryContext& context) const {
+  const XQueryQuantifiedExprItem& binding = *_items[clause];
+  if (binding.type() && !XQueryInstanceOf(item.get(), *binding.type(), &context)) {
+    return XQueryErrors::invalidType.errorAtLine(binding.exprLine());
+  }
+  context._internal().setVariable(std::move(item), binding.varID());
+  return evaluatePostion(index + 1, context);
+}
+
+// The same as for a list of the items.
+Value XQueryQuantifiedExpr::evaluateGiven(size_t clause, size_t index,
+                                          XQueryContext& context) const {
+  class Asking final : public XQueryItemGiver::Taker {
+   public:
+    Asking(const XQueryQuantifiedExpr& quantifier, size_t clause, size_t index,
+           XQueryContext& context)
+        : _quantifier(quantifier), _clause(clause), _index(index), _context(context) {}
+    Value answer;
+
+    bool take(Value item) override {
+      answer = _quantifier.evaluateItem(_clause, _index, std::move(item), _context);
+      return answer == _quantifier.undecided();
+    }
+
+   private:
+    const XQueryQuantifiedExpr& _quantifier;
+    const size_t _clause;
+    const size_t _index;
+    XQueryContext& _context;
+  };
+  Asking asking(*this, clause, index, context);
+  if (!_items[clause]->giver()->giveItems(context, asking)) return {};
+  return std::move(asking.answer);
 }
 
 // The same of the items that may decide; there are others.

@@ -53,6 +53,8 @@ class XQueryQuantifiedExpr : public XQueryExpr {
   // The misspelling belongs to the name.
   Value evaluatePostion(size_t index, XQueryContext& withContext) const;
   Value evaluateItems(size_t clause, size_t index, XQueryContext& context) const;
+  Value evaluateGiven(size_t clause, size_t index, XQueryContext& context) const;
+  Value evaluateItem(size_t clause, size_t index, Value item, XQueryContext& context) const;
   Value evaluatePicks(size_t clause, const XQueryPicks& picks, XQueryContext& context) const;
   // What an item answers that leaves the question open.
   Value undecided() const { return NSNumber::numberWithBool(_every); }

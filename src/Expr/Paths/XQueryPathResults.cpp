@@ -88,7 +88,9 @@ void XQueryPathResults::storeByIdentity(NSObject* item) {
 void XQueryPathResults::append(NSObject* item) {
   _lastStored = item;
   ++_count;
-  if (_countsOnly) {
+  if (_taker) {
+    if (!_taker->take(Value(item))) _most = 0;
+  } else if (_countsOnly) {
     _counted.push_back(cast<NSXMLNode>(item));
   } else if (_array) {
     _array->objects().push_back(Value(item));

@@ -1,5 +1,6 @@
 // What a path's last step yields: duplicates removed by identity, ordered on request.
 // Where only their number is asked for, and perhaps not beyond some number, nothing is referenced.
+// Nodes that arrive in the order of the value may be taken one by one instead.
 //
 // While nodes of one tree arrive in strictly ascending document order, which is nearly always, the
 // order itself proves that they are distinct and sorted: no identity set is kept and nothing is
@@ -9,6 +10,7 @@
 #pragma once
 
 #include "Expr/Paths/IdentitySet.h"
+#include "Expr/XQueryItemGiver.h"
 #include "xquery/Collection.h"
 #include "xquery/Object.h"
 #include "xquery/XMLNode.h"
@@ -30,8 +32,18 @@ class XQueryPathResults {
   void endAfter(uint64_t most) { _most = most; }
   // Of nodes only the number is wanted.
   void countOnly() { _countsOnly = true; }
-  // All are wanted after all.
-  void takeAll() { _most = UINT64_MAX; }
+  // Each node is handed to a taker as it arrives, which says when no more are wanted. To be said
+  // first, too; nodes arrive in document order.
+  void handTo(XQueryItemGiver::Taker& taker) {
+    _taker = &taker;
+    _most = UINT64_MAX - 1;
+  }
+  // All are wanted after all, and none is handed to a taker.
+  void takeAll() {
+    _most = UINT64_MAX;
+    _taker = nullptr;
+  }
+  bool areHandedOn() const { return _taker != nullptr; }
   bool countsOnly() const { return _countsOnly; }
   // Whether they may be complete before all nodes have been found.
   bool mayEndEarly() const { return _most != UINT64_MAX; }
@@ -61,6 +73,7 @@ class XQueryPathResults {
   uint64_t _most = UINT64_MAX;
   uint64_t _count = 0;
   bool _countsOnly = false;
+  XQueryItemGiver::Taker* _taker = nullptr;
   // In place of the items, where they are counted only.
   std::vector<NSXMLNode*, ValueAllocator<NSXMLNode*>> _counted;
   Value _firstResult;   // the only item

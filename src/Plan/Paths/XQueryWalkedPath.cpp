@@ -5,6 +5,7 @@
 #include "Expr/Paths/XQueryPathResults.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Operators/XQueryNodeQuestion.h"
+#include "Plan/Paths/XQueryPathGivers.h"
 #include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
@@ -52,6 +53,33 @@ Value itemFromBack(const Value& items, uint64_t behind) {
   if (item && item->kind() != Kind::Null) kept.add(item);
   return kept.value();
 }
+
+// What deals with each node in the focus that there was before the walk.
+class InFormerFocus final : public XQueryItemGiver::Taker {
+ public:
+  InFormerFocus(XQueryItemGiver::Taker& taker, XQueryContextInternal& context)
+      : _taker(taker),
+        _context(context),
+        _item(context.contextItem()),
+        _position(context.position()),
+        _last(context.last()) {}
+
+  bool take(Value item) override {
+    putBack();
+    return _taker.take(std::move(item));
+  }
+  void putBack() {
+    _context.setContextItem(_item, _position);
+    _context.setLast(_last);
+  }
+
+ private:
+  XQueryItemGiver::Taker& _taker;
+  XQueryContextInternal& _context;
+  const Value _item;
+  const int64_t _position;
+  const int64_t _last;
+};
 
 }  // namespace
 
@@ -146,6 +174,31 @@ Value XQueryWalkedPath::firstItems(uint64_t most, XQueryContext& context) const 
   const Answer answer = evaluate(context, items, results);
   if (answer == Answer::Results) return results.value(context._internal().ordered());
   return answer == Answer::Items ? items : Value();
+}
+
+bool XQueryWalkedPath::giveItems(XQueryContext& context, XQueryItemGiver::Taker& taker) const {
+  auto& dynamic = context._internal();
+  if (showsErrors(context)) {
+    const Value items = plain().evaluateWithContext(context);
+    if (XQueryHasFailed(items, context)) return false;
+    XQueryGiveItems(items, taker);
+    return !dynamic.isFailing();
+  }
+  XQueryCheckStack(context);
+  InFormerFocus inFocus(taker, dynamic);
+  XQueryPathResults results;
+  results.handTo(inFocus);
+  Value items;
+  const Answer answer = walk(context, items, results);
+  // An error leaves the focus as it was when it was raised.
+  if (answer == Answer::Failed || dynamic.isFailing()) return false;
+  inFocus.putBack();
+  if (answer == Answer::Results) {
+    if (results.areHandedOn()) return true;
+    items = results.value(dynamic.ordered());
+  }
+  XQueryGiveItems(items, taker);
+  return !dynamic.isFailing();
 }
 
 // An item that is no node is an error, wherever it stands among the others. The first nodes of all

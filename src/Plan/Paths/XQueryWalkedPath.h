@@ -4,6 +4,7 @@
 #pragma once
 
 #include "Expr/Paths/XQueryPath.h"
+#include "Expr/XQueryItemGiver.h"
 #include "Expr/XQueryPicker.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
 #include "Plan/Paths/XQueryPathWalk.h"
@@ -51,6 +52,11 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   // Its value, of which only the first so many items are wanted: there may be more of them. Null
   // after an error. For a path that findsInOrder.
   Value firstItems(uint64_t most, XQueryContext& context) const;
+
+  // Hands on one node after another as the walk finds them, until the taker wants no more of them;
+  // the items of the value where they do not come in its order. False after an error, that of the
+  // taker as well. For a path that findsInOrder.
+  bool giveItems(XQueryContext& context, XQueryItemGiver::Taker& taker) const;
 
   // Who picks the items of one of the steps that its predicates may keep: items of the start, or
   // nodes of an axis step, before which there are but the start and axis steps whose tests raise

@@ -1,0 +1,28 @@
+#include "Plan/Paths/XQueryPathGivers.h"
+
+#include "Expr/XQuerySequence.h"
+
+namespace xquery {
+
+void XQueryGiveItems(const Value& list, XQueryItemGiver::Taker& taker) {
+  const XQueryItemList items(list.get());
+  for (size_t i = 0; i < items.count(); ++i) {
+    if (!taker.take(Value(items[i]))) return;
+  }
+}
+
+bool XQueryShortPathGiver::giveItems(XQueryContext& context, Taker& taker) const {
+  auto& dynamic = context._internal();
+  if (NSXMLNode* const start = _walk.start(context); start && !dynamic.showsErrors()) {
+    // The variable that it starts from may be the one that takes the nodes.
+    const Value held(start);
+    _walk.visit(start, [&taker](NSXMLNode* found) { return taker.take(Value(found)); });
+  } else {
+    const Value items = _path->evaluateWithContext(context);
+    if (XQueryHasFailed(items, context)) return false;
+    XQueryGiveItems(items, taker);
+  }
+  return !dynamic.isFailing();
+}
+
+}  // namespace xquery
