@@ -68,6 +68,8 @@ class XQueryNodeTest {
   // Makes it accept none but these kinds.
   void restrictTo(uint32_t kinds) { _kinds &= kinds; }
   uint32_t kinds() const { return _kinds; }
+  // Whether it takes every node of these kinds.
+  bool asksForKindAlone() const { return !_name && !_askFurther; }
 
   bool matches(const NSXMLNode* node) {
     if ((_kinds & XQueryKindBit(node->kind())) == 0) return false;

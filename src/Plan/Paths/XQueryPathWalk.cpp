@@ -400,6 +400,7 @@ void XQueryPathWalk::streamMatching(size_t index, int axis, NSXMLNode* node, Vis
   } else {
     XQueryWalkAnyAxis(node, axis, false, visitOf(handOn));
   }
+  _met += asked;
   if (step.lookup) step.lookup->noteAsked(node, asked);
   if (isLast) results.setIsReversed(step.isReverse());
 }
@@ -409,6 +410,7 @@ void XQueryPathWalk::filter(size_t index, int axis, NSXMLNode* node) {
   const XQueryWalkedStep& step = _steps[index];
   std::vector<NSXMLNode*>& nodes = openNodeList();
   const size_t predicatesDone = collect(step, axis, node, nodes);
+  _met += nodes.size();
   if (step.lookup) step.lookup->noteAsked(node, nodes.size());
   if (listingStep == &step) {
     listed->insert(listed->end(), nodes.begin(), nodes.end());

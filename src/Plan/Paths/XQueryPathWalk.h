@@ -26,6 +26,9 @@
 //   onlyCounts    Where nothing but the number of all nodes below a node is wanted that a step
 //                 finds, none is kept. Of some names it is that of stretches of the index, whose
 //                 nodes are not looked at.
+//   alongWays     Steps down from the document by names alone, "/site/people/person", find what the
+//                 index of the tree knows of its ways: their number, and the nodes where these are
+//                 all of their name. What comes behind such steps goes on from there.
 //   filtersEach   Where only some of the nodes are wanted, or their number, a step filters each
 //                 node as it finds it and hands it on, so that the walk ends as soon as the answer
 //                 is certain.
@@ -75,6 +78,12 @@ class XQueryPathWalk : public XQueryPathRun {
   // Whether the first step is joined with the one after it where it starts from the node.
   bool absorbsNext(const XQueryWalkedStep& step, const NSXMLNode* node) const;
 
+  // The whole path from one node, where that is a document whose index knows what the first steps
+  // find; false for: walk.
+  bool takeAlongWays(const Value& start);
+  // Afterwards, so that the index is made when that has been asked often enough.
+  void noteMet() const;
+
   // From step `index` on, for a value of any shape, for one node, and for the nodes that a step
   // with predicates kept. Behind the last step they are the results.
   void takeValue(size_t index, const Value& items, bool validate);
@@ -105,6 +114,9 @@ class XQueryPathWalk : public XQueryPathRun {
   bool keepNodes(const XQueryExpr& predicate, const XQueryNodeQuestion& question,
                  std::vector<NSXMLNode*>& nodes);
 
+  class Ways;
+  void takeIndexed(NSXMLNodeSpan nodes, size_t steps);
+
   // A trail begins anew where a tree has changed since it was last asked for: what a predicate of
   // an earlier step constructs may give the nodes a parent.
   XQueryAxisTrail& trail(size_t index);
@@ -118,6 +130,8 @@ class XQueryPathWalk : public XQueryPathRun {
   const std::span<const XQueryWalkedStep> _steps;
   const size_t _trailCount;
   std::vector<Trail> _trails;
+  uint64_t _met = 0;                       // nodes that steps have taken
+  const NSXMLNode* _notesMetOf = nullptr;  // a document; null for none
 };
 
 }  // namespace xquery

@@ -238,7 +238,11 @@ XQueryWalkedPath::Answer XQueryWalkedPath::walk(XQueryContext& context, Value& i
   walk.startsFromOne = isa<NSXMLNode>(items.get());
   walk.orderIsFree = dynamic.ordered();
   if (results.mayEndEarly() && !mayEndEarly(items, walk)) results.takeAll();
-  if (!_picker || !pickNodes(items, walk)) walk.takeValue(0, items, true);
+  const bool isTaken = _picker ? pickNodes(items, walk) : walk.takeAlongWays(items);
+  if (!isTaken) {
+    walk.takeValue(0, items, true);
+    walk.noteMet();
+  }
   return walk.hasFailed ? Answer::Failed : Answer::Results;
 }
 

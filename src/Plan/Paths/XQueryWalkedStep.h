@@ -100,6 +100,13 @@ class XQueryStepTest {
   const NSXMLExpandedName* onlyName() const { return _isOfName ? _test.onlyName() : nullptr; }
   // The same for names of which a node needs one; instructions may have them as well.
   const NSXMLNameSelection* onlyNames() const { return _context ? nullptr : _choice; }
+  // Whether every element matches, with every other child that has a name.
+  bool takesAllNamed() const {
+    constexpr uint32_t unnamed = XQueryKindBit(Kind::Text) | XQueryKindBit(Kind::Comment);
+    return !_choice && _test.asksForKindAlone() && takesElements() &&
+           (_test.kinds() & unnamed) == 0;
+  }
+  bool takesElements() const { return (_test.kinds() & XQueryKindBit(Kind::Element)) != 0; }
   bool acceptsInstructions() const {
     return (_test.kinds() & XQueryKindBit(Kind::ProcessingInstruction)) != 0;
   }

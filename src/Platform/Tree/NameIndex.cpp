@@ -23,56 +23,126 @@ size_t NSXMLNameIndex::placeOf(const NSXMLIndexList<Name>& table, const NSXMLExp
   return place;
 }
 
-// Notes the nodes in document order, each with the number of its name, and then puts them name by
-// name. While it does so, a name's `begin` is its number and its `end` how many nodes it has.
+// Notes the nodes in document order, each with its way, and then puts them name by name. Ways are
+// found by the way above and the name as it is written, so that no name is looked at for a node.
+// Where there are too many, and for attributes, names are all there is: every way is below the
+// first one.
 class NSXMLNameIndex::Maker {
  public:
-  explicit Maker(uint32_t mostNodes) : _table(smallestTable) {
+  explicit Maker(uint32_t mostNodes, bool hasWays = true)
+      : _table(smallestTable), _hasWays(hasWays) {
     _arrived.reserve(mostNodes);
-    _numbers.reserve(mostNodes);
+    _wayOf.reserve(mostNodes);
+    _ways.emplace_back();
   }
 
-  void add(const NSXMLNode* node) {
+  // Answers its way.
+  uint32_t add(const NSXMLNode* node, uint32_t above) {
     const NSXMLName* const written = node->nodeName();
-    size_t place = placeOf(_table, written->expanded);
-    if (!_table[place].name) place = addName(written);
-    Name& name = _table[place];
-    if (name.writtenAs != written) name.writtenAs = nullptr;
-    ++name.end;
-    _numbers.push_back(name.begin);
+    size_t place = placeOf(_table, _hasWays ? above : 0, written);
+    if (!_table[place].way) place = addWay(node, written, above);
+    const uint32_t way = _table[place].way;
+    ++_ways[way].count;
+    _wayOf.push_back(way);
     _arrived.push_back(node);
+    return way;
   }
+  uint32_t above(uint32_t way) const { return _ways[way].above; }
   void addInstruction() { _hasInstructions = true; }
   std::unique_ptr<const NSXMLNameIndex> index();
 
  private:
-  size_t addName(const NSXMLName* written) {
-    if (2 * (size_t{_nameCount} + 1) > _table.size()) grow();
-    const size_t place = placeOf(_table, written->expanded);
-    _table[place] = {written->expanded, written, _nameCount++, 0};
+  struct Place {
+    const NSXMLName* written = nullptr;
+    uint32_t above = 0;
+    uint32_t way = 0;  // 0 for none
+  };
+
+  static size_t placeOf(const NSXMLIndexList<Place>& table, uint32_t above,
+                        const NSXMLName* written) {
+    constexpr uint64_t mix = 0x9E3779B97F4A7C15;
+    const size_t mask = table.size() - 1;
+    const uint64_t key = (reinterpret_cast<uintptr_t>(written) >> 3) + (uint64_t{above} << 32);
+    size_t place = (key * mix >> 32) & mask;
+    while (table[place].way && (table[place].written != written || table[place].above != above)) {
+      place = (place + 1) & mask;
+    }
+    return place;
+  }
+  size_t addWay(const NSXMLNode* node, const NSXMLName* written, uint32_t above) {
+    if (_hasWays && _ways.size() > mostWays) {
+      _hasWays = false;
+      for (Way& each : _ways) each.above = 0;
+    }
+    if (!_hasWays) above = 0;
+    if (2 * (_ways.size() + 1) > _table.size()) grow();
+    const size_t place = placeOf(_table, above, written);
+    // There may be one by now, as that of a name alone.
+    if (_table[place].way) return place;
+    const auto way = static_cast<uint32_t>(_ways.size());
+    _table[place] = {written, above, way};
+    _ways.push_back({written, node, above, 0, 0, _ways[above].below});
+    _ways[above].below = way;
     return place;
   }
   void grow() {
-    NSXMLIndexList<Name> old(2 * _table.size());
+    NSXMLIndexList<Place> old(2 * _table.size());
     old.swap(_table);
+    WorkPacer pacer;
+    for (const Place& each : old) {
+      pacer.turn();
+      if (each.way) _table[placeOf(_table, each.above, each.written)] = each;
+    }
+  }
+  static void growNames(NSXMLIndexList<Name>& table) {
+    NSXMLIndexList<Name> old(2 * table.size());
+    old.swap(table);
     WorkPacer pacer;
     for (const Name& each : old) {
       pacer.turn();
-      if (each.name) _table[placeOf(_table, each.name)] = each;
+      if (each.name) table[NSXMLNameIndex::placeOf(table, each.name)] = each;
     }
   }
+  NSXMLIndexList<Name> names(NSXMLIndexList<uint32_t>& nameOf);
+  // Where there are nearly as many ways as elements, walks are short.
+  bool areWaysOfUse() const {
+    return _hasWays && _ways.size() * sizeof(Way) <= _arrived.size() * sizeof(NSXMLNodePlace);
+  }
 
-  NSXMLIndexList<Name> _table;
-  uint32_t _nameCount = 0;
+  NSXMLIndexList<Place> _table;  // 2^n places, at most half of them taken
+  NSXMLIndexList<Way> _ways;
+  bool _hasWays;
   bool _hasInstructions = false;
   NSXMLNodeList _arrived;
-  NSXMLIndexList<uint32_t> _numbers;  // of the names of those nodes
+  NSXMLIndexList<uint32_t> _wayOf;  // those nodes
 };
+
+// The table of the names, each with its number for `begin` and how many nodes it has for `end`;
+// `nameOf` takes the numbers by way.
+NSXMLIndexList<NSXMLNameIndex::Name> NSXMLNameIndex::Maker::names(
+    NSXMLIndexList<uint32_t>& nameOf) {
+  NSXMLIndexList<Name> table(smallestTable);
+  uint32_t count = 0;
+  WorkPacer pacer;
+  for (size_t way = 1; way < _ways.size(); ++way) {
+    pacer.turn();
+    if (2 * (size_t{count} + 1) > table.size()) growNames(table);
+    const NSXMLName* const written = _ways[way].name;
+    Name& name = table[NSXMLNameIndex::placeOf(table, written->expanded)];
+    if (!name.name) name = {written->expanded, written, count++, 0};
+    if (name.writtenAs != written) name.writtenAs = nullptr;
+    name.end += _ways[way].count;
+    nameOf[way] = name.begin;
+  }
+  return table;
+}
 
 std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::Maker::index() {
   WorkPacer pacer;
-  NSXMLIndexList<uint32_t> next(_nameCount);  // by number: where the name's next node goes
-  for (const Name& each : _table) {
+  NSXMLIndexList<uint32_t> nameOf(_ways.size());
+  NSXMLIndexList<Name> table = names(nameOf);
+  NSXMLIndexList<uint32_t> next(_ways.size());  // by number: where the name's next node goes
+  for (const Name& each : table) {
     if (each.name) next[each.begin] = each.end;
   }
   uint32_t sum = 0;
@@ -82,7 +152,7 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::Maker::index() {
     each = sum;
     sum += count;
   }
-  for (Name& each : _table) {
+  for (Name& each : table) {
     pacer.turn();
     if (!each.name) continue;
     each.begin = next[each.begin];
@@ -91,9 +161,13 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::Maker::index() {
   std::unique_ptr<NSXMLNameIndex> made(new NSXMLNameIndex);
   made->_nodes.arrange(_arrived, [&](size_t i) {
     pacer.turn();
-    return next[_numbers[i]]++;
+    return next[nameOf[_wayOf[i]]]++;
   });
-  made->_table = std::move(_table);
+  made->_table = std::move(table);
+  if (areWaysOfUse()) {
+    _ways.shrink_to_fit();
+    made->_ways = std::move(_ways);
+  }
   made->_hasInstructions = _hasInstructions;
   return made;
 }
@@ -102,20 +176,32 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofElements(const NSXMLNode
                                                                  uint32_t mostNodes) {
   Maker maker(mostNodes);
   WorkPacer pacer;
-  for (const NSXMLNode* node = root; node; node = node->nextNode()) {
+  uint32_t above = 0;
+  for (const NSXMLNode* node = root; node;) {
     pacer.turn();
+    uint32_t way = above;
     if (node->kind() == Kind::Element) {
-      maker.add(node);
+      way = maker.add(node, above);
     } else if (node->kind() == Kind::ProcessingInstruction) {
       maker.addInstruction();
     }
+    if (const NSXMLNode* const child = node->firstChild()) {
+      above = way;
+      node = child;
+      continue;
+    }
+    while (node && !node->nextSibling()) {
+      node = node->parent();
+      above = maker.above(above);
+    }
+    if (node) node = node->nextSibling();
   }
   return maker.index();
 }
 
 std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofAttributes(const NSXMLNode* root,
                                                                    uint32_t mostNodes) {
-  Maker maker(mostNodes);
+  Maker maker(mostNodes, false);
   WorkPacer pacer;
   for (const NSXMLNode* node = root; node; node = node->nextNode()) {
     pacer.turn();
@@ -124,11 +210,74 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofAttributes(const NSXMLNo
     for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
          attribute = NSXMLElement::nextAttribute(attribute)) {
       pacer.turn();
-      maker.add(attribute);
+      maker.add(attribute, 0);
     }
   }
   return maker.index();
 }
+
+// --- ways ----------------------------------------------------------------------------------------
+
+// Those that a step leads to, below one of them.
+void NSXMLNameIndex::addBelow(uint32_t way, const NSXMLWayStep& step, Ways& found) const {
+  const auto takes = [&step](const Way& each) {
+    if (step.name) return each.name->expanded == step.name;
+    if (!step.selection) return true;
+    return step.selection->mayTake(*each.name->expanded) && step.selection->takes(*each.first);
+  };
+  for (uint32_t each = _ways[way].below; each; each = behind(each, way, step.isDeep)) {
+    if (takes(_ways[each])) found.push_back(each);
+  }
+}
+
+// The next one of those below the top one, or of those that are longer than it by a name; 0 for
+// none.
+uint32_t NSXMLNameIndex::behind(uint32_t way, uint32_t top, bool isDeep) const {
+  if (isDeep && _ways[way].below) return _ways[way].below;
+  while (!_ways[way].next) {
+    way = _ways[way].above;
+    if (!isDeep || way == top) return 0;
+  }
+  return _ways[way].next;
+}
+
+NSXMLNameIndex::Ways NSXMLNameIndex::waysAlong(std::span<const NSXMLWayStep> steps) const {
+  Ways ways(1);
+  Ways further;
+  WorkPacer pacer;
+  for (const NSXMLWayStep& step : steps) {
+    further.clear();
+    for (const uint32_t way : ways) {
+      pacer.turn();
+      addBelow(way, step, further);
+    }
+    // One below another is found from both.
+    if (step.isDeep) {
+      std::sort(further.begin(), further.end());
+      further.erase(std::unique(further.begin(), further.end()), further.end());
+    }
+    ways.swap(further);
+  }
+  return ways;
+}
+
+uint64_t NSXMLNameIndex::countOn(const Ways& ways) const {
+  uint64_t count = 0;
+  for (const uint32_t way : ways) count += _ways[way].count;
+  return count;
+}
+
+std::optional<uint64_t> NSXMLNameIndex::countAlong(std::span<const NSXMLWayStep> steps) const {
+  return _ways.empty() ? std::nullopt : std::optional(countOn(waysAlong(steps)));
+}
+
+std::optional<NSXMLNodeSpan> NSXMLNameIndex::nodesAlong(std::span<const NSXMLWayStep> steps) const {
+  if (_ways.empty() || steps.empty() || !steps.back().name) return std::nullopt;
+  const NSXMLNodeSpan all = nodes(steps.back().name);
+  return countOn(waysAlong(steps)) == all.size() ? std::optional(all) : std::nullopt;
+}
+
+// --- names ---------------------------------------------------------------------------------------
 
 NSXMLNodeSpan NSXMLNameIndex::nodes(const NSXMLExpandedName* name) const {
   const Name& found = _table[placeOf(_table, name)];

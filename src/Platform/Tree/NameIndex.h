@@ -2,6 +2,16 @@
 //
 //   table   name -> end of its nodes, which begin where those of the name before it end
 //   nodes   a a a a b b c c c ...       one array, name by name
+//   ways    of elements: the names from the top down to some of them, as a tree of names, with
+//           their number; documents have few, as many as there are sorts of things in them
+//
+//             site -+- regions -+- africa --- item (55) -+- name (55)
+//                   |           +- asia ----- item (200) ...
+//                   +- people --- person (2550) ...
+//
+// So how many elements the steps of a path from the document find is known without looking at any
+// of them, and where all elements of a name lie on the ways of a path these are what it finds. None
+// are kept where there are very many, or so many that they would take more memory than the nodes.
 //
 // An index is made in one pass and never changes. It is of the tree as it was: whoever uses it sees
 // to it that the tree has not changed (TreeIndexes.h). The pass looks at limits; one that is ended
@@ -17,6 +27,8 @@
 #include <cstddef>
 #include <cstdint>
 #include <memory>
+#include <optional>
+#include <span>
 
 namespace xquery {
 
@@ -32,8 +44,17 @@ class NSXMLNameSelection {
   ~NSXMLNameSelection() = default;
 };
 
+// A step from elements, or from the document, down to elements.
+struct NSXMLWayStep {
+  bool isDeep = false;                            // to descendants, not to children alone
+  const NSXMLExpandedName* name = nullptr;        // that they have, or
+  const NSXMLNameSelection* selection = nullptr;  // one of several; with neither, any
+};
+
 class NSXMLNameIndex {
  public:
+  static constexpr size_t mostWays = 4096;
+
   // Of everything under the root of a tree whose order numbers are good. Room is made for at most
   // so many nodes at once, and for more as they come.
   [[nodiscard]] static std::unique_ptr<const NSXMLNameIndex> ofElements(const NSXMLNode* root,
@@ -52,6 +73,11 @@ class NSXMLNameIndex {
   // differently.
   uint64_t count(const NSXMLNameSelection& selection, const NSXMLNode* first,
                  const NSXMLNode* stop) const;
+  // How many elements the steps find from the document at the root, each counted once; none where
+  // the ways are not known.
+  std::optional<uint64_t> countAlong(std::span<const NSXMLWayStep> steps) const;
+  // These, where the last step asks for a name, all of whose elements they are.
+  std::optional<NSXMLNodeSpan> nodesAlong(std::span<const NSXMLWayStep> steps) const;
   // Whether the tree of an index of elements has processing instructions, which have names too.
   bool hasInstructions() const { return _hasInstructions; }
   // Of nodes in document order those from `first` on that come before `stop`, which is null for the
@@ -68,7 +94,22 @@ class NSXMLNameIndex {
     uint32_t begin = 0;
     uint32_t end = 0;
   };
-  // The list of nodes and that of their names, and the result.
+  // A way that some elements lie on, or, the first one, the place above the topmost.
+  struct Way {
+    const NSXMLName* name = nullptr;  // as it is written
+    const NSXMLNode* first = nullptr;
+    uint32_t above = 0;
+    uint32_t count = 0;
+    uint32_t below = 0;  // the last one of those that are longer by a name; 0 for none
+    uint32_t next = 0;   // another one of the same length
+  };
+  using Ways = NSXMLIndexList<uint32_t>;
+  void addBelow(uint32_t way, const NSXMLWayStep& step, Ways& found) const;
+  uint32_t behind(uint32_t way, uint32_t top, bool isDeep) const;
+  Ways waysAlong(std::span<const NSXMLWayStep> steps) const;
+  uint64_t countOn(const Ways& ways) const;
+
+  // The list of nodes and that of their ways, and the result.
   static constexpr size_t bytesPerNode = 2 * sizeof(NSXMLNodePlace) + sizeof(uint32_t);
 
   NSXMLNameIndex() = default;
@@ -85,6 +126,7 @@ class NSXMLNameIndex {
 
   NSXMLIndexList<Name> _table;  // 2^n places, at most half of them taken
   NSXMLNodeList _nodes;
+  NSXMLIndexList<Way> _ways;  // empty where they are not known
   bool _hasInstructions = false;
 };
 

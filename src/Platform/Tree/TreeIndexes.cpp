@@ -236,6 +236,19 @@ std::optional<uint64_t> NSXMLCountIndexedElements(const NSXMLNameSelection& name
   return elements ? std::optional(elements->count(names, first, stop)) : std::nullopt;
 }
 
+NSXMLIndexedWays NSXMLIndexedWays::of(const NSXMLNode* document) {
+  NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(document);
+  const NSXMLNameIndex* const elements = indexes ? indexes->elements(0) : nullptr;
+  return {std::move(indexes), elements};
+}
+
+void NSXMLNoteWalked(uint64_t nodes, const NSXMLNode* document) {
+  constexpr uint64_t nodesPerChild = 8;
+  if (NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(document)) {
+    indexes->addWork(nodes * nodesPerChild);
+  }
+}
+
 NSXMLIndexedValues NSXMLIndexedValues::of(const NSXMLValueKey& key, const NSXMLNode* first,
                                           const NSXMLNode* stop) {
   IndexesForWalk walk = indexesForWalk(first, stop);

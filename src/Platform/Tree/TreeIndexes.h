@@ -71,6 +71,8 @@ class NSXMLTreeIndexes {
   // how many nodes that walk will meet.
   const NSXMLNameIndex* elements(uint64_t work);
   const NSXMLNameIndex* attributes(uint64_t work);
+  // For walks that are known when they are done.
+  void addWork(uint64_t work) { _elements.workDone.fetch_add(work, std::memory_order_relaxed); }
   // `work` includes the way from each element to its values.
   const NSXMLValueIndex* values(const NSXMLValueKey& key, uint64_t work);
   // What such a walk has come to, where it is not known before.
@@ -145,6 +147,16 @@ struct NSXMLIndexedNodes {
                                                                 bool withInstructions,
                                                                 const NSXMLNode* first,
                                                                 const NSXMLNode* stop);
+// What is known of the elements below a document, which is the root of its tree; null for: walk.
+struct NSXMLIndexedWays {
+  NSXMLIndexesRef indexes;
+  const NSXMLNameIndex* elements = nullptr;
+
+  [[nodiscard]] static NSXMLIndexedWays of(const NSXMLNode* document);
+};
+// For: walk, after which it is told how many nodes that has met. These are children, which lie
+// apart from each other.
+void NSXMLNoteWalked(uint64_t nodes, const NSXMLNode* document);
 // The elements of the name in the key from `first` on before `stop` by their values; null for:
 // walk.
 struct NSXMLIndexedValues {
