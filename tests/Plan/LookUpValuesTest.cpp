@@ -57,8 +57,32 @@ TEST(LookUpValues, TakesStepsWithAnEqualityAmongTheirPredicates) {
   EXPECT_EQ(lookupsIn("for $i in //e return $i/e[@id = $i/@id]"), 1U);
 }
 
+// The root above a predicate's context item is that of the tree that is looked in.
+TEST(LookUpValues, TakesProbesFromTheRootInPredicates) {
+  for (const char* text :
+       {"/r/e[@id = /r/e[8]/@id]/@n", "//e[/r/e[3]/k[1] = k]/@id",
+        "(//e | //k)[@id = /r/e[3]/@id]/@n", "count(/r/*[k = //e[@n = '7'][1]/k])",
+        "//e[some $k in k satisfies $k = /r/e[2]/k[1]]/@id", "//e[k[. = (//e)[2]/k[1]]]/@id",
+        "for $i in 1 to 9 return /r/e[@id = //e[$i]/@id]/k"}) {
+    EXPECT_GE(lookupsIn(text), 1U) << text;
+    resultOf(text);
+    resultOf("for $i in 1 to 9 return (" + std::string(text) + ")");
+    resultOf("//e[@id = 'e3']/(" + std::string(text) + ")");
+    resultOf("<a><b id='e8'/></a>/b/(" + std::string(text) + ")");
+  }
+  // In another focus there may be another root, or none.
+  for (const char* text :
+       {"for $e in /r/e where $e/@id = /r/e[8]/@id return $e/k",
+        "declare function local:f($e) { $e/@id = /r/e[8]/@id }; /r/e[local:f(.)]"}) {
+    EXPECT_EQ(lookupsIn(text), 0U) << text;
+    resultOf(text);
+  }
+}
+
 TEST(LookUpValues, LeavesOtherStepsAlone) {
-  for (const char* text : {"/r/e[@id != 'e7']",
+  for (const char* text : {"for $e in /r/e where $e/@id = /r/e[@n = '8'][1]/s return $e",
+                           "/r/e[@id = ../@id]",
+                           "/r/e[@id != 'e7']",
                            "/r/e[@id < 'e7']",
                            "/r/e[@id = 7]",
                            "/r/e[1][@id = 'e7']",
@@ -326,9 +350,22 @@ TEST(LookUpValues, AgreeWithWalkingOverGeneratedQueries) {
   RandomChoices random(20041029);
   const std::vector<std::string> keys = {"@id", "@n",  "k", "e/@id", "s/@x",
                                          "k/b", "e/k", ".", "./k",   "e//k"};
-  const std::vector<std::string> probes = {
-      "'e3'",       "'3'",  "'k3'",   "'a'",  "'k10'",           "$p", "string($p)", "3",
-      "($p, 'e4')", "'10'", "'k10a'", "$p/k", "('k3', 'e9', $p)"};
+  const std::vector<std::string> probes = {"'e3'",
+                                           "'3'",
+                                           "'k3'",
+                                           "'a'",
+                                           "'k10'",
+                                           "$p",
+                                           "string($p)",
+                                           "3",
+                                           "($p, 'e4')",
+                                           "'10'",
+                                           "'k10a'",
+                                           "$p/k",
+                                           "('k3', 'e9', $p)",
+                                           "/r/e[4]/@id",
+                                           "//e[5]/k[1]",
+                                           "//e[@n < 5]/k"};
   const std::vector<std::string> others = {"", "[s]", "[not(k)]", "[@n < 20]", "[count(k) > 1]"};
   for (int i = 0; i < 80; ++i) {
     const std::string key = random.oneOf(keys), probe = random.oneOf(probes);

@@ -28,6 +28,12 @@ Range rangeOf(NSXMLNode* node, int axis) {
   return {withNode ? node : node->nextNode(), XQueryDescendantStop(node)};
 }
 
+bool isWorthAsking(const Range& range) {
+  if (!range.first || range.first == range.stop) return false;
+  return !range.stop ||
+         range.stop->orderNumber() - range.first->orderNumber() >= NSXMLTreeIndexes::fewNodes;
+}
+
 NSXMLValueKey keyOf(Of of, const NSXMLExpandedName* name, const XQueryValueWay& way) {
   if (of == Of::Name) return way.keyFor(*name);
   if (of == Of::AnyName) return way.keyOfEnd();
@@ -69,6 +75,17 @@ void putInOrder(std::vector<NSXMLNode*>& nodes) {
   nodes.erase(std::unique(nodes.begin(), nodes.end()), nodes.end());
 }
 
+// The probe may read the root above the focus, which is that above every candidate.
+Value valueFrom(const XQueryExpr& probe, NSXMLNode* node, XQueryContext& context) {
+  auto& dynamic = context._internal();
+  Value item = dynamic.contextItem();
+  const int64_t position = dynamic.position();
+  dynamic.setContextItem(Value(node), 1);
+  Value value = XQueryValueOrNull(probe, context);
+  dynamic.setContextItem(std::move(item), position);
+  return value;
+}
+
 }  // namespace
 
 XQueryValueLookup::XQueryValueLookup(Of of, const NSXMLExpandedName* name,
@@ -89,16 +106,11 @@ bool XQueryValueLookup::areTexts(const XQueryItemList& probes) const {
   return true;
 }
 
-// False where walking must tell. The nodes of one value come in document order, unless the way
-// leads up from them.
-bool XQueryValueLookup::addNodesWith(const NSXMLValueIndex& values, const NSXMLNode* first,
-                                     const NSXMLNode* stop, XQueryStepTest& test,
-                                     XQueryContext& context,
+// The nodes of one value come in document order, unless the way leads up from them.
+void XQueryValueLookup::addNodesWith(const NSXMLValueIndex& values, const XQueryItemList& probes,
+                                     const NSXMLNode* first, const NSXMLNode* stop,
+                                     XQueryStepTest& test,
                                      std::vector<NSXMLNode*>& candidates) const {
-  const Value value = XQueryValueOrNull(*_probe.expr, context);
-  if (!value) return false;
-  const XQueryItemList probes(value.get());
-  if (!areTexts(probes)) return false;
   WorkPacer pacer;
   for (size_t index = 0; index < probes.count(); ++index) {
     pacer.turn();
@@ -113,7 +125,6 @@ bool XQueryValueLookup::addNodesWith(const NSXMLValueIndex& values, const NSXMLN
     }
   }
   if (_of == Of::AnyName || probes.count() > 1) putInOrder(candidates);
-  return true;
 }
 
 // Nodes in document order may have starts in another one, and several the same.
@@ -142,13 +153,16 @@ bool XQueryValueLookup::find(NSXMLNode* node, int axis, XQueryStepTest& test,
   if ((axis == XQueryAxisAttributesBelow) != (_of == Of::Attribute)) return false;
   if (_name && test.onlyName() != _name.get()) return false;
   const Range range = rangeOf(node, axis);
-  if (!range.first || range.first == range.stop || !_way.isOpen(context)) return false;
+  if (!isWorthAsking(range) || !_way.isOpen(context)) return false;
+  // No index is made for what it cannot answer.
+  const Value value = valueFrom(*_probe.expr, node, context);
+  const XQueryItemList probes(value.get());
+  if (!value || !areTexts(probes)) return false;
   const auto indexed = NSXMLIndexedValues::of(_key, range.first, range.stop);
   if (!indexed.values) return false;
-  if (!addNodesWith(*indexed.values, range.first, range.stop, test, context, candidates)) {
-    return false;
-  }
-  return axis != XQueryAxisChild || keepChildren(node, candidates);
+  addNodesWith(*indexed.values, probes, range.first, range.stop, test, candidates);
+}
+return axis != XQueryAxisChild || keepChildren(node, candidates);
 }
 
 void XQueryValueLookup::noteAsked(const NSXMLNode* node, size_t nodes) const {

@@ -29,7 +29,8 @@ class XQueryValueLookup {
     Attribute,  // attributes of one name, by their own value
   };
   struct Probe {
-    Ref<XQueryExpr> expr;  // repeatable, does not read the focus
+    // Repeatable, and of the focus it reads the root at most: that above the step's nodes.
+    Ref<XQueryExpr> expr;
     // An element without a value meets the empty text.
     bool meetsNoneWhenEmpty = false;
     // Of several values it is enough to equal one; otherwise they are an error.
@@ -49,8 +50,8 @@ class XQueryValueLookup {
 
  private:
   bool areTexts(const XQueryItemList& probes) const;
-  bool addNodesWith(const NSXMLValueIndex& values, const NSXMLNode* first, const NSXMLNode* stop,
-                    XQueryStepTest& test, XQueryContext& context,
+  void addNodesWith(const NSXMLValueIndex& values, const XQueryItemList& probes,
+                    const NSXMLNode* first, const NSXMLNode* stop, XQueryStepTest& test,
                     std::vector<NSXMLNode*>& candidates) const;
   void climb(NSXMLNodeSpan ends, const NSXMLNode* first, XQueryStepTest& test,
              std::vector<NSXMLNode*>& candidates) const;

@@ -6,8 +6,9 @@
 //             P let ... where C"
 // Facts       of the step: all predicates ask for truth, whatever place a node has, and can be
 //             repeated with all steps behind; of the value that is asked for: it is repeatable and
-//             does not read the focus; of a clause: it has neither position nor type, what is left
-//             in its variable cannot be told, and let clauses behind it cannot fail
+//             does not read the focus, but for the root in a predicate; of a clause: it has neither
+//             position nor type, what is left in its variable cannot be told, and let clauses
+//             behind it cannot fail
 // Operator    none: the step is told by which key its nodes are found (XQueryValueLookup)
 // Why         untyped values are compared with texts by their texts, and equal texts are what the
 //             index answers; its candidates are asked the condition as before. A node that is none

@@ -163,8 +163,12 @@ class Search {
 
   bool isProbe(XQueryPlaceID place, const Start& from) const {
     const XQueryFacts& probe = facts(place);
-    return isIdleButForErrors(place) && !probe.does(XQueryDeeds::ReadsFocus) &&
-           probe.assigns.isEmpty() && !probe.reads.meets(from.own) &&
+    using namespace XQueryDeeds;
+    // All that a predicate looks at is in the tree of its context item, as are its ways.
+    const bool isInPredicate = from.origin.errorExcludes && !from.caller;
+    const unsigned unknown = isInPredicate ? ReadsFocus & ~unsigned{ReadsRoot} : ReadsFocus;
+    return isIdleButForErrors(place) && !probe.does(unknown) && probe.assigns.isEmpty() &&
+           !probe.reads.meets(from.own) &&
            probe.mayBe(XQueryItems::Node | XQueryItems::Untyped | XQueryItems::String);
   }
   bool isIdleButForErrors(XQueryPlaceID place) const {

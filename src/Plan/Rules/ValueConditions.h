@@ -11,7 +11,9 @@ namespace xquery {
 // The condition holds only where the way leads to a value that equals the probe.
 struct XQueryValueCondition {
   XQueryValueWay way;
-  Ref<XQueryExpr> probe;            // repeatable, does not read the focus
+  // Repeatable; does not read the focus, but for the root above the context item where an error in
+  // the condition excludes the node, too.
+  Ref<XQueryExpr> probe;
   bool meetsNoneWhenEmpty = false;  // or where it leads to none and the probe is the empty text
   bool takesSeveral = false;        // the probe may be several values, of which one is equal
 };
