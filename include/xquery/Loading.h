@@ -55,6 +55,18 @@ class XQUERY_EXPORT XQueryLoadingPolicy {
   // where they lead to a place below an allowed folder, and are refused otherwise.
   XQueryLoadingPolicy& allowFilesBelow(const std::string& folder);
 
+  // What is at or below a URL on a server: its scheme, host and port, and the segments of its path.
+  // "http://h/a" allows "http://h/a", "http://h/a?q" and "http://h/a/b", and not "http://h/ab";
+  // "http://h/a/" does not allow "http://h/a". Compared are the two as RFC 3986 normalises them:
+  // the case of scheme and host, a port that is the scheme's own, "." and ".." in the path, escapes
+  // of letters and digits. Nothing is below a URL without a host, of the scheme file, with a user
+  // name, a query or a fragment.
+  //
+  // Never allowed so is a URL with a user name, one whose host holds an escape, and one whose path
+  // holds an escaped ".." or one with parameters ("..;x"), which servers read in different ways.
+  // Schemes and hosts that are allowed, or not, do not matter; forbidden addresses do.
+  XQueryLoadingPolicy& allowURLsBelow(std::string_view URL);
+
   // From the first call on, of URLs with a host only those of the hosts named, whatever the scheme
   // but file; their schemes have to be allowed as well. Names are compared ignoring case and as
   // the URL writes them: a name and an address are different hosts. Ports do not matter.
@@ -91,10 +103,12 @@ class XQUERY_EXPORT XQueryLoadingPolicy {
     std::string place;     // canonical; the root is empty, the others without a slash
   };
   bool allowsHostOf(const NSURL& URL) const;
+  bool isBelowAllowedURL(const NSURL& URL) const;
 
   std::vector<std::string> _schemes;  // in lower case
   std::vector<Folder> _folders;
   std::vector<std::string> _hosts;  // in lower case; any when there are none
+  std::vector<std::string> _URLs;   // normalised
   uint8_t _forbiddenAddresses = 0;  // a bit for each kind
 };
 

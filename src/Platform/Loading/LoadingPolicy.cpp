@@ -1,5 +1,6 @@
 #include "Platform/Loading/FolderWalk.h"
 #include "Platform/Loading/LocalPath.h"
+#include "Platform/Loading/ServerURL.h"
 #include "Platform/Text/ASCII.h"
 #include "xquery/Loading.h"
 
@@ -65,6 +66,11 @@ XQueryLoadingPolicy& XQueryLoadingPolicy::allowHost(std::string_view name) {
   return *this;
 }
 
+XQueryLoadingPolicy& XQueryLoadingPolicy::allowURLsBelow(std::string_view URL) {
+  if (auto prefix = normalisedServerPrefix(URL)) _URLs.push_back(std::move(*prefix));
+  return *this;
+}
+
 XQueryLoadingPolicy& XQueryLoadingPolicy::forbidAddresses(XQueryAddressKind kind) {
   _forbiddenAddresses |= bitOf(kind);
   return *this;
@@ -118,9 +124,18 @@ bool XQueryLoadingPolicy::allowsHostOf(const NSURL& URL) const {
   return _hosts.empty() || !isServerScheme(URL.scheme());
 }
 
+bool XQueryLoadingPolicy::isBelowAllowedURL(const NSURL& URL) const {
+  if (_URLs.empty()) return false;
+  const auto asked = normalisedServerURL(URL.absoluteString()->utf8());
+  return asked && std::any_of(_URLs.begin(), _URLs.end(), [&](const std::string& prefix) {
+           return isBelowServerURL(*asked, prefix);
+         });
+}
+
 bool XQueryLoadingPolicy::allowsURL(const NSURL& URL) const {
   const std::string scheme = URL.scheme();
   if (scheme.empty()) return false;
+  if (isBelowAllowedURL(URL)) return true;
   if (allowsScheme(scheme)) return scheme == "file" || allowsHostOf(URL);
   if (scheme != "file" || _folders.empty()) return false;
   const auto path = localPathOf(URL);

@@ -139,6 +139,88 @@ TEST(LoadingPolicy, HostsComeOnTopOfSchemes) {
   EXPECT_FALSE(allows(policy, "app://elsewhere/"));
 }
 
+// --- URLs ----------------------------------------------------------------------------------------
+
+TEST(LoadingPolicy, AUrlAllowsWhatIsAtItAndBelow) {
+  const Policy policy =
+      Policy::denyAll().allowURLsBelow("http://a.b/data").allowURLsBelow("https://c:8443/x/");
+  for (const auto* URL : {"http://a.b/data", "http://a.b/data/", "http://a.b/data/d.xml?q=1#f",
+                          "http://a.b/data?q", "https://c:8443/x/", "https://c:8443/x/y/z",
+                          "http://a.b/data/%2Fx", "http://a.b/data/a;b"}) {
+    EXPECT_TRUE(allows(policy, URL)) << URL;
+  }
+  for (const auto* URL :
+       {"http://a.b/", "http://a.b/database", "http://a.b", "https://c:8443/x", "https://c/x/y",
+        "https://a.b/data", "http://a.b:8080/data/", "http://a.b.evil/data", "http://evil/data",
+        "http://a.b@evil/data", "http://evil/http://a.b/data", "http:a.b/data", "/data", "data"}) {
+    EXPECT_FALSE(allows(policy, URL)) << URL;
+  }
+}
+
+TEST(LoadingPolicy, AServerEndsWhereItsNameEnds) {
+  for (const auto* server : {"http://a.b", "http://a.b/", "http://A.B.:80/"}) {
+    const Policy policy = Policy::denyAll().allowURLsBelow(server);
+    EXPECT_TRUE(allows(policy, "http://a.b")) << server;
+    EXPECT_TRUE(allows(policy, "http://a.b/x/y")) << server;
+    EXPECT_FALSE(allows(policy, "http://a.b.evil/")) << server;
+    EXPECT_FALSE(allows(policy, "http://a.bevil/")) << server;
+    EXPECT_FALSE(allows(policy, "http://a.b:81/")) << server;
+  }
+  EXPECT_TRUE(allows(Policy::denyAll().allowURLsBelow("http://[::1]:81/"), "http://[::1]:81/x"));
+  EXPECT_FALSE(allows(Policy::denyAll().allowURLsBelow("http://[::1]:81/"), "http://[::1]/x"));
+}
+
+TEST(LoadingPolicy, UrlsAreComparedAsTheyAreNormalised) {
+  const Policy policy = Policy::denyAll().allowURLsBelow("HTTP://A.b:80/x/../D%61ta/%7e/%c3%a4/");
+  for (const auto* URL : {"http://a.b/Data/~/%C3%A4/f", "hTTp://a.B:080/D%61ta/%7E/%c3%A4/",
+                          "http://a.b:/Data/./~/y/../%c3%a4/f", "http://a.b./Data/%7e/%C3%A4/f"}) {
+    EXPECT_TRUE(allows(policy, URL)) << URL;
+  }
+  EXPECT_FALSE(allows(policy, "http://a.b/data/~/%C3%A4/f")) << "the case of a path matters";
+  const Policy escaped = Policy::denyAll().allowURLsBelow("http://a.b/a%2Fb/");
+  EXPECT_TRUE(allows(escaped, "http://a.b/a%2fb/c"));
+  EXPECT_FALSE(allows(escaped, "http://a.b/a/b/c")) << "an escaped slash is no slash";
+}
+
+TEST(LoadingPolicy, DotsDoNotLeadOutOfAUrl) {
+  const Policy policy = Policy::denyAll().allowURLsBelow("http://h/d/");
+  for (const auto* URL :
+       {"http://h/d/../s", "http://h/d/%2e%2e/s", "http://h/d/.%2E/s", "http://h/d/..%2Fs",
+        "http://h/d/%2e%2e%2fs", "http://h/d/..%5Cs", "http://h/d/x%2f..%2f..%2fs",
+        "http://h/d/..;x/s", "http://h/d/%2e%2e;/s", "http://h/d/.."}) {
+    EXPECT_FALSE(allows(policy, URL)) << URL;
+  }
+  EXPECT_TRUE(allows(policy, "http://h/d/x/../s"));
+  EXPECT_TRUE(allows(policy, "http://h/d/...")) << "a name";
+}
+
+TEST(LoadingPolicy, WhatTwoProgramsReadDifferentlyIsBelowNoUrl) {
+  const Policy policy = Policy::denyAll().allowURLsBelow("http://h/");
+  for (const auto* URL : {"http://user@h/", "http://@h/", "http://h%2eevil/", "http://%68/",
+                          "http://h:99999/", "http:///h/", "http://:80/"}) {
+    EXPECT_FALSE(allows(policy, URL)) << URL;
+  }
+}
+
+TEST(LoadingPolicy, WhatIsNoServersUrlAllowsNothing) {
+  for (const auto* URL : {"", "h", "/d/", "http:", "http://", "http://u@h/", "http://h/?q",
+                          "http://h/#f", "file:///", "file://h/", "http://h/ x", "http://h:x/"}) {
+    const Policy policy = Policy::denyAll().allowURLsBelow(URL);
+    EXPECT_FALSE(allows(policy, "http://h/")) << URL;
+    EXPECT_FALSE(allows(policy, "file:///etc/hosts")) << URL;
+  }
+}
+
+TEST(LoadingPolicy, AUrlIsAllowedBesideSchemesAndHosts) {
+  Policy policy = Policy::denyAll().allowScheme("https").allowHost("h");
+  policy.allowURLsBelow("http://other/x/").allowURLsBelow("app://archive/");
+  EXPECT_TRUE(allows(policy, "https://h/"));
+  EXPECT_TRUE(allows(policy, "http://other/x/y"));
+  EXPECT_TRUE(allows(policy, "app://archive/d.xml"));
+  EXPECT_FALSE(allows(policy, "https://other/x/y"));
+  EXPECT_FALSE(allows(policy, "http://h/"));
+}
+
 TEST(LoadingPolicy, AddressesAreForbiddenByKind) {
   Policy policy = Policy::allowAll();
   EXPECT_FALSE(policy.forbidsAddresses(XQueryAddressKind::Private));
