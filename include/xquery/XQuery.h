@@ -19,8 +19,10 @@
 #include <functional>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace xquery {
 
@@ -120,8 +122,16 @@ class XQUERY_EXPORT XQuery : public NSCounted {
   std::unique_ptr<XQueryInternal> _private;
 };
 
-// What a host may implement to hear fn:trace. Without a client a trace is written to the log, one
-// line of label and value, when the environment variable XQUERY_LOG is set, not empty and not "0".
+// A document that a query named and that is missing, malformed or forbidden; in UTF-8.
+struct XQueryMissingDocument {
+  std::string URL;     // resolved, without the user name and the password that it may hold
+  std::string reason;  // for people: "No such file or directory", "not allowed", "status 404",
+                       // "line 3, column 7: " and what is wrong there
+};
+
+// What a host may implement to hear fn:trace, and of documents that are missing. Without a client a
+// trace is written to the log, one line of label and value, when the environment variable
+// XQUERY_LOG is set, not empty and not "0".
 //
 //   class Tracer : public XQueryClient {
 //     void XQueryClientTraceValue(const Value& value, const Ref<NSString>& label,
@@ -136,16 +146,24 @@ class XQUERY_EXPORT XQueryClient {
   // `value` is what was traced, in any of the value shapes but null: the NSNull for the empty
   // sequence, an item, or an NSArray. Both live during the call; keep a Ref to hold them longer.
   // Called on the evaluating thread; evaluating against the same context from here is not allowed.
+  // Unless overridden the trace is written to the log as it is without a client.
   virtual void XQueryClientTraceValue(const Value& value, const Ref<NSString>& label,
-                                      XQueryContext& context) = 0;
+                                      XQueryContext& context);
+  // A document could not be had, and fn:doc answers the empty sequence in place of an error. Called
+  // once for each URL in the life of the context, and once more where the context has forgotten
+  // that it is missing; on the evaluating thread, and with the same prohibition. Does nothing
+  // unless overridden.
+  virtual void XQueryClientMissesDocument(const XQueryMissingDocument& document,
+                                          XQueryContext& context);
 };
 
 // The object against which queries are evaluated. It keeps, from one evaluation to the next:
 //   - what the host gave it: client, namespaces, loading settings, limits
 //   - the context item, which stays in force for an evaluation that is given none
 //   - the clock: current-dateTime and its kin answer the moment when the context was first asked
-//   - the documents that fn:doc loaded, and which URLs gave none: neither is fetched again,
-//     but where such URLs come to more than 4 MiB all of them are forgotten between evaluations
+//   - the documents that fn:doc loaded, and which URLs gave none: neither is fetched again, but
+//     where such URLs come to more than 4 MiB all of them are forgotten between evaluations, and
+//     between the records of a stream
 //   - the base URIs recorded for constructed nodes, and its last error
 //
 // One context for many evaluations is right for one task over documents that do not change, such as
@@ -261,6 +279,19 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   Ref<NSArray> shapedResult(const Value& result, Ref<XQueryError>* error);
   std::unique_ptr<XQueryContextInternal> _private;
 };
+
+// --- looking at the library ----------------------------------------------------------------------
+
+// A function that every query may call without declaring it.
+struct XQueryFunctionName {
+  std::string namespaceURI;
+  std::string localName;
+  unsigned leastArguments;
+  std::optional<unsigned> mostArguments;  // none: any number
+};
+
+// All of them, in no particular order: what an editor may offer.
+[[nodiscard]] XQUERY_EXPORT std::vector<XQueryFunctionName> XQueryLibraryFunctions();
 
 // --- looking at results --------------------------------------------------------------------------
 

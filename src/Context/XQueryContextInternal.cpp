@@ -33,8 +33,8 @@ uint64_t nextBaseURIOwner() {
 
 }  // namespace
 
-XQueryContextInternal::XQueryContextInternal()
-    : _baseURIOwner(nextBaseURIOwner()), _loader(NSURLLoader::loaderWithLoading()) {}
+XQueryContextInternal::XQueryContextInternal(XQueryContext& owner)
+    : _owner(owner), _baseURIOwner(nextBaseURIOwner()), _loader(NSURLLoader::loaderWithLoading()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;
 

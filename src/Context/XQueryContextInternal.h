@@ -34,7 +34,8 @@ bool XQueryIsLimit(const XQueryError* error);
 
 class XQueryContextInternal {
  public:
-  XQueryContextInternal();
+  // `owner` is what the host knows the context by.
+  explicit XQueryContextInternal(XQueryContext& owner);
   ~XQueryContextInternal();
 
   // --- variables -------------------------------------------------------------------------------
@@ -116,8 +117,9 @@ class XQueryContextInternal {
   // The raw bytes; null when they cannot be had. What was loaded as a document, or could not be,
   // has none.
   Ref<NSData> URLBody(const Ref<NSURL>& URL);
-  // Between evaluations: forgets the failures when they take more than a context may keep. Other
-  // documents are wanted again, but any number of URLs can be made up that name nothing.
+  // Between evaluations and between records: forgets the failures when they take more than a
+  // context may keep. Other documents are wanted again, but any number of URLs can be made up that
+  // name nothing.
   void forgetManyFailures();
   NSURLLoader& loader() const { return *_loader; }
   void setLoading(const XQueryLoading& loading);
@@ -182,6 +184,11 @@ class XQueryContextInternal {
  private:
   enum class Failure : uint8_t { None, Error, WantOfMemory };
 
+  // Null, with the reason, when it cannot be had.
+  Ref<NSXMLDocument> loadDocument(const NSURL& URL, std::string& reason);
+  void tellOfMissingDocument(const NSURL& URL, std::string reason);
+
+  XQueryContext& _owner;
   XQueryFrameRef _variables;
   XQueryNamespaceStack _inScopeNamespaces;
   std::array<NSXMLNameRef, 4> _declarationNames;  // those asked for last

@@ -2,6 +2,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Platform/Base/CountedBytes.h"
+#include "Platform/Base/HostFailure.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Reading/XMLDocuments.h"
 #include "Platform/Text/ASCII.h"
@@ -39,6 +40,12 @@ bool isHTML(const XQueryResource& resource, const NSURL& URL) {
   return path.ends_with(".html") || path.ends_with(".htm");
 }
 
+std::string placed(const NSXMLParseError& error) {
+  if (error.line == 0) return error.message;
+  return "line " + std::to_string(error.line) + ", column " + std::to_string(error.column) + ": " +
+         error.message;
+}
+
 }  // namespace
 
 void XQueryContextInternal::setLoading(const XQueryLoading& loading) {
@@ -50,27 +57,50 @@ Value XQueryContextInternal::XQueryDocumentForURL(const Ref<NSURL>& URL) {
     return found->second;
   }
   XQueryCheckStackFor(*this, stackForLoading);
-  // The host may set other settings while its loader is called.
-  const Ref<NSURLLoader> loader = _loader;
-  const auto resource = loader->load(*URL, XQueryLoadPurpose::Document);
-  Value result = NSNull::null();
-  CountedBytes counted;
-  if (resource) counted.add(resource->data.size());
-  if (resource && NSURLLoader::hasUsableStatus(*resource)) {
-    const uint32_t options = isHTML(*resource, *URL) ? HTMLOptions : XMLOptions;
-    const uint64_t mostBytes = loader->loading().limits.mostBytes;
-    NSXMLParseError ignored;
-    if (const auto document =
-            documentWithBoundedData(resource->data, options, mostBytes, ignored)) {
-      document->setURI(URL->absoluteString());
-      result = document;
-    }
-  }
+  std::string reason;
+  const Ref<NSXMLDocument> document = loadDocument(*URL, reason);
   // A document that a limit kept from being made is not missing.
   lookAtWork();
+  const Value result = document ? Value(document) : Value(NSNull::null());
   _documentCache.insert_or_assign(URL, result);
-  if (result == NSNull::null()) _failureBytes += bytesOf(*URL);
+  if (document) return result;
+  _failureBytes += bytesOf(*URL);
+  tellOfMissingDocument(*URL, std::move(reason));
   return result;
+}
+
+Ref<NSXMLDocument> XQueryContextInternal::loadDocument(const NSURL& URL, std::string& reason) {
+  // The host may set other settings while its loader is called.
+  const Ref<NSURLLoader> loader = _loader;
+  const auto resource = loader->load(URL, XQueryLoadPurpose::Document);
+  if (!resource) {
+    reason = loader->failure();
+    return nullptr;
+  }
+  CountedBytes counted;
+  counted.add(resource->data.size());
+  if (!NSURLLoader::hasUsableStatus(*resource)) {
+    reason = "status " + std::to_string(*resource->statusCode);
+    return nullptr;
+  }
+  const uint32_t options = isHTML(*resource, URL) ? HTMLOptions : XMLOptions;
+  NSXMLParseError error;
+  const auto document =
+      documentWithBoundedData(resource->data, options, loader->loading().limits.mostBytes, error);
+  if (document) {
+    document->setURI(URL.absoluteString());
+  } else {
+    reason = placed(error);
+  }
+  return document;
+}
+
+void XQueryContextInternal::tellOfMissingDocument(const NSURL& URL, std::string reason) {
+  const std::shared_ptr<XQueryClient> client = _client;
+  if (!client) return;
+  const XQueryMissingDocument document{withoutCredentials(URL.absoluteString()->utf8()),
+                                       std::move(reason)};
+  passingOnHostFailures([&] { client->XQueryClientMissesDocument(document, _owner); });
 }
 
 void XQueryContextInternal::forgetManyFailures() {

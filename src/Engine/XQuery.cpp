@@ -155,7 +155,7 @@ Ref<XQueryContext> XQueryContext::xqueryContextWithNamespaces(
 }
 
 XQueryContext::XQueryContext()
-    : NSCounted(Kind::Context), _private(std::make_unique<XQueryContextInternal>()) {}
+    : NSCounted(Kind::Context), _private(std::make_unique<XQueryContextInternal>(*this)) {}
 
 XQueryContext::~XQueryContext() = default;
 
@@ -187,11 +187,27 @@ const XQueryLimits& XQueryContext::contextLimits() const {
 
 void XQueryContext::contextAddClientSelector(std::string_view, std::string_view) {}
 
+namespace {
+
+void logTrace(const Value& value, const Ref<NSString>& label) {
+  if (!XQueryLogEnabled()) return;
+  NSLog(XQueryDescription(label.get())->utf8() + " " + XQueryDescription(value.get())->utf8());
+}
+
+}  // namespace
+
+void XQueryClient::XQueryClientTraceValue(const Value& value, const Ref<NSString>& label,
+                                          XQueryContext&) {
+  logTrace(value, label);
+}
+
+void XQueryClient::XQueryClientMissesDocument(const XQueryMissingDocument&, XQueryContext&) {}
+
 void XQueryContext::_traceValue(const Value& value, const Ref<NSString>& forLabel) {
   if (const auto client = _private->client()) {
     passingOnHostFailures([&] { client->XQueryClientTraceValue(value, forLabel, *this); });
-  } else if (XQueryLogEnabled()) {
-    NSLog(XQueryDescription(forLabel.get())->utf8() + " " + XQueryDescription(value.get())->utf8());
+  } else {
+    logTrace(value, forLabel);
   }
 }
 

@@ -337,6 +337,101 @@ TEST_F(Loading, ADocumentMayNotReadBesideItself) {
             "(empty)");
 }
 
+// --- what the client hears -----------------------------------------------------------------------
+
+class Hearer : public XQueryClient {
+ public:
+  void XQueryClientMissesDocument(const XQueryMissingDocument& document,
+                                  XQueryContext& context) override {
+    heard.push_back(document.URL + " - " + document.reason);
+    lastContext = &context;
+    lastThread = std::this_thread::get_id();
+    if (throws) throw std::length_error("mine");
+  }
+  std::vector<std::string> heard;
+  XQueryContext* lastContext = nullptr;
+  std::thread::id lastThread;
+  bool throws = false;
+};
+
+class MissingDocuments : public Loading {
+ protected:
+  void SetUp() override { context->contextSetClient(client); }
+  // How many items a query has.
+  size_t count(const std::string& text) {
+    const auto items = context->evaluateXQuery(*XQuery::xqueryWithSource(text), {}, {});
+    return items ? items->count() : 9999;
+  }
+  std::shared_ptr<Hearer> client = std::make_shared<Hearer>();
+};
+
+TEST_F(MissingDocuments, AreToldToTheClientWithUrlAndReason) {
+  server.redirect("/away", "ftp://example.org/x");
+  const std::string none = fileURL(folder.path("none.xml")),
+                    broken = folder.write("broken.xml", "<a>\n <b></a>");
+  EXPECT_EQ(count("(doc('" + none + "'), doc('" + broken + "'), doc('" + server.URL("/404") +
+                  "'), doc('" + server.URL("/away") + "'), doc('ftp://user:secret@h/x'))"),
+            0u);
+  ASSERT_EQ(client->heard.size(), 5u);
+  EXPECT_EQ(client->heard[0], none + " - No such file or directory");
+  EXPECT_EQ(client->heard[1].find(broken + " - line 2, column "), 0u) << client->heard[1];
+  EXPECT_EQ(client->heard[2], server.URL("/404") + " - status 404");
+  EXPECT_EQ(client->heard[3],
+            server.URL("/away") + " - redirected to ftp://example.org/x, which is not allowed");
+  EXPECT_EQ(client->heard[4], "ftp://h/x - not allowed");
+  EXPECT_EQ(client->lastContext, context.get());
+  EXPECT_EQ(client->lastThread, std::this_thread::get_id());
+}
+
+TEST_F(MissingDocuments, AreToldOnceForEachUrlAndContext) {
+  EXPECT_EQ(count("for $i in 1 to 3 return (doc('gone:a'), doc('gone:b'))"), 0u);
+  EXPECT_EQ(count("doc('gone:a')"), 0u);
+  EXPECT_EQ(client->heard,
+            (std::vector<std::string>{"gone:a - not allowed", "gone:b - not allowed"}));
+  context = XQueryContext::xqueryContext();
+  context->contextSetClient(client);
+  EXPECT_EQ(count("doc('gone:a')"), 0u);
+  EXPECT_EQ(client->heard.size(), 3u);
+}
+
+TEST_F(MissingDocuments, AreNotThoseThatAreThereOrGiveAnError) {
+  EXPECT_EQ(count("doc('" + folder.write("a.xml", "<a/>") + "')"), 1u);
+  EXPECT_EQ(count("doc('a b')"), 9999u);
+  EXPECT_EQ(count("doc('')"), 0u);
+  EXPECT_EQ(client->heard, std::vector<std::string>());
+  EXPECT_EQ(count("doc('a.xml')"), 0u);
+  EXPECT_EQ(client->heard[0], "a.xml - a relative URL, and nothing to resolve it against");
+}
+
+TEST_F(MissingDocuments, PassOnWhatTheClientThrows) {
+  client->throws = true;
+  EXPECT_THROW(count("doc('gone:a')"), std::length_error);
+  EXPECT_EQ(count("doc('gone:a')"), 0u);
+}
+
+TEST_F(MissingDocuments, AreEmptyToAClientThatDoesNotAsk) {
+  context->contextSetClient(std::make_shared<XQueryClient>());
+  EXPECT_EQ(count("doc('gone:a')"), 0u);
+}
+
+// --- a policy of URLs ----------------------------------------------------------------------------
+
+TEST_F(Loading, RedirectsOutOfAnAllowedUrlAreRefused) {
+  server.answer("/in/a", "application/xml", "<a/>");
+  server.answer("/out", "application/xml", "<b/>");
+  server.redirect("/in/there", "/in/x/../a");
+  server.redirect("/in/out", "/out");
+  server.redirect("/in/dots", "/in/%2e%2e/out");
+  setPolicy(XQueryLoadingPolicy::denyAll().allowURLsBelow(server.URL("/in/")));
+  EXPECT_EQ(document(server.URL("/in/a")), "<a/>");
+  EXPECT_EQ(document(server.URL("/in/there")), "<a/>");
+  EXPECT_EQ(document(server.URL("/in/out")), "(empty)");
+  EXPECT_EQ(document(server.URL("/in/dots")), "(empty)");
+  EXPECT_EQ(document(server.URL("/out")), "(empty)");
+  EXPECT_EQ(document(server.URL("/in/../out")), "(empty)");
+  EXPECT_EQ(server.requests("/out"), 0);
+}
+
 // --- the host's loader ---------------------------------------------------------------------------
 
 class Archive : public XQueryLoader {

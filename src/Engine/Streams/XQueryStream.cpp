@@ -140,6 +140,7 @@ class Stream {
       if (!evaluateRecord(folding)) return false;
       _internal._setInScopeVariables(nullptr);
       _internal.clearKept();
+      _internal.forgetManyFailures();
       _internal.setContextItem(records.document(), 1);
       if (!_isDecided && records.references() != references) {
         _internal.raise(XQueryErrors::nodeOfAStreamKept.error());

@@ -76,7 +76,8 @@ std::optional<XQueryResource> NSURLLoader::load(const NSURL& URL, XQueryLoadPurp
 std::optional<XQueryResource> NSURLLoader::loadAllowed(const NSURL& URL,
                                                        XQueryLoadPurpose purpose) {
   if (!_loading.policy.allowsURL(URL)) {
-    _failure = "not allowed";
+    const bool isRelative = URL.scheme().empty();
+    _failure = isRelative ? "a relative URL, and nothing to resolve it against" : "not allowed";
     return std::nullopt;
   }
   if (_loading.loader) return loadFromHost(URL, purpose);

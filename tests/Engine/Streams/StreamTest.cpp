@@ -242,6 +242,28 @@ TEST(Stream, TakesNoMoreMemoryHoweverLongItIs) {
   }
 }
 
+// The names are new in each record, and what is remembered of them is bounded.
+TEST(Stream, MayMissAnyNumberOfDocuments) {
+  constexpr int records = 60'000;
+  int number = 0;
+  std::string left = "<a>";
+  XQueryStreamInput input;
+  input.read = [&](char* buffer, size_t size) {
+    if (left.empty() && number++ < records) left = "<b>" + std::to_string(number) + "</b>";
+    if (left.empty() && number == records + 1) left = "</a>";
+    const size_t count = left.copy(buffer, size);
+    left.erase(0, count);
+    return static_cast<ptrdiff_t>(count);
+  };
+  XQueryLimits limits;
+  limits.memoryCeiling = 8 << 20;
+  const auto context = XQueryContext::xqueryContext();
+  context->contextSetLimits(limits);
+  const Answer answer = streamed(*context, "count(/a/b[doc(concat('gone:', .))])", input);
+  EXPECT_EQ(answer.error, "");
+  EXPECT_EQ(answer.items, std::vector<std::string>{"xs:integer:0"});
+}
+
 TEST(Stream, EndsAtItsLimits) {
   const auto context = XQueryContext::xqueryContext();
   XQueryLimits limits;
