@@ -28,20 +28,31 @@ std::string forBash() {
   std::string names = "--help --version", cases;
   for (const OptionRow& row : optionRows()) {
     names += std::string(" ") + row.name;
-    if (row.takes != Takes::Value && row.takes != Takes::Values) continue;
+    if (row.takes == Takes::Nothing) continue;
     std::string action = "return";
     if (row.offers == Offers::Words) {
-      action = "COMPREPLY=($(compgen -W '" + joined(words(row)) + "' -- \"$word\")); return";
+      action = "COMPREPLY=($(compgen -P \"$lead\" -W '" + joined(words(row)) +
+               "' -- \"$word\")); return";
     } else if (row.offers == Offers::Files) {
-      action = "mapfile -t COMPREPLY < <(compgen -f -- \"${word#*=}\"); return";
+      action = "mapfile -t COMPREPLY < <(compgen -P \"$lead\" -f -- \"${word#*=}\"); return";
     } else if (row.offers == Offers::Folders) {
-      action = "mapfile -t COMPREPLY < <(compgen -d -- \"$word\"); return";
+      action = "mapfile -t COMPREPLY < <(compgen -P \"$lead\" -d -- \"$word\"); return";
     }
-    cases += std::string("    ") + row.name + ") " + action + " ;;\n";
+    // What may be left out stands behind "=" alone.
+    const std::string name = row.name, apart = row.takes == Takes::MaybeValue ? "" : name + "|";
+    cases += "    " + apart + name + "=) " + action + " ;;\n";
   }
+  // Bash takes "=" for a word of its own, where it is one of those that break words.
   return "_xquery() {\n"
-         "  local word=${COMP_WORDS[COMP_CWORD]} before=${COMP_WORDS[COMP_CWORD-1]}\n"
+         "  local word=${COMP_WORDS[COMP_CWORD]} before=${COMP_WORDS[COMP_CWORD-1]} lead=\n"
          "  COMPREPLY=()\n"
+         "  if [[ $word == = ]]; then\n"
+         "    word= before=$before=\n"
+         "  elif [[ $before == = ]]; then\n"
+         "    before=${COMP_WORDS[COMP_CWORD-2]}=\n"
+         "  elif [[ $word == --*=* ]]; then\n"
+         "    before=${word%%=*}= lead=${word%%=*}= word=${word#*=}\n"
+         "  fi\n"
          "  case $before in\n" +
          cases +
          "  esac\n"

@@ -20,12 +20,18 @@ struct CloseFile {
   void operator()(std::FILE* file) const { std::fclose(file); }
 };
 
+// Of a query. What has no end is not read until memory has.
+constexpr size_t mostQueryBytes = size_t{64} << 20;
+
 // A directory opens but cannot be read.
-std::string readAll(std::FILE* file, const std::string& name) {
+std::string readAll(std::FILE* file, const std::string& name, size_t mostBytes) {
   std::string text;
   char piece[65536];
   while (const size_t count = file ? std::fread(piece, 1, sizeof piece, file) : 0) {
     text.append(piece, count);
+    if (text.size() <= mostBytes) continue;
+    const std::string most = std::to_string(mostBytes >> 20) + " MiB";
+    throw Failure{StatusInput, "xquery: " + name + ": longer than " + most, {}};
   }
   if (file && !std::ferror(file)) return text;
   throw Failure{StatusInput, "xquery: " + name + ": " + std::strerror(errno), {}};
@@ -38,13 +44,10 @@ bool showsProgress(const Options& options) {
 
 }  // namespace
 
-std::string readFile(const std::string& path) {
+std::string readFile(const std::string& path, size_t mostBytes) {
+  if (path == "-") return readAll(stdin, shownName(path), mostBytes);
   const std::unique_ptr<std::FILE, CloseFile> file(std::fopen(path.c_str(), "rb"));
-  return readAll(file.get(), path);
-}
-
-std::string readStandardInput() {
-  return readAll(stdin, inputName("-"));
+  return readAll(file.get(), shownName(path), mostBytes);
 }
 
 // A script's first line, which names the command to the system, is for the query a blank one.
@@ -55,8 +58,7 @@ static std::string withoutInterpreter(std::string text) {
 
 static std::string queryBytes(const Options& options) {
   if (options.queryText) return *options.queryText;
-  return withoutInterpreter(options.queryFile == "-" ? readStandardInput()
-                                                     : readFile(options.queryFile));
+  return withoutInterpreter(readFile(options.queryFile, mostQueryBytes));
 }
 
 Ref<NSString> queryText(const Options& options) {
@@ -64,7 +66,7 @@ Ref<NSString> queryText(const Options& options) {
   const Ref<NSString> text = NSString::stringWithUTF8(bytes);
   if (!text) {
     const std::string name =
-        options.queryText ? "the query given with -e" : inputName(options.queryFile);
+        options.queryText ? "the query given with -e" : shownName(options.queryFile);
     throw Failure{StatusInput, "xquery: " + name + ": not UTF-8 text", {}};
   }
   return text;
@@ -74,12 +76,16 @@ std::string inputName(const std::string& path) {
   return path == "-" ? "standard input" : path;
 }
 
+std::string shownName(const std::string& path) {
+  return visibleName(inputName(path));
+}
+
 uint32_t readingMode(const Options& options) {
   return options.stripSpace ? NSXMLNodeOptionsNone : NSXMLNodePreserveWhitespace;
 }
 
 Failure readingFailure(const std::string& path, const NSXMLParseError& error) {
-  const std::string name = inputName(path);
+  const std::string name = shownName(path);
   if (error.line == 0) {
     // The reason why a file cannot be read begins with its path.
     const size_t named = error.message.starts_with(path + ": ") ? path.size() + 2 : 0;
@@ -92,7 +98,7 @@ Failure readingFailure(const std::string& path, const NSXMLParseError& error) {
 }
 
 DocumentProgress::DocumentProgress(const Options& options, const std::string& path) {
-  if (showsProgress(options)) _line.emplace(visible(inputName(path)));
+  if (showsProgress(options)) _line.emplace(shownName(path));
 }
 
 NSXMLReadingProgress DocumentProgress::callback() {

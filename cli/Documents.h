@@ -19,9 +19,9 @@ struct Failure {
   std::vector<xquery::Ref<xquery::NSError>> errors;  // that it describes, of the query
 };
 
-// The bytes of a file; throws Failure.
-std::string readFile(const std::string& path);
-std::string readStandardInput();
+// The bytes of a file, or of standard input for "-"; throws Failure, also where there are more than
+// so many.
+std::string readFile(const std::string& path, size_t mostBytes);
 
 // The query, as -e or its file gives it; throws Failure.
 xquery::Ref<xquery::NSString> queryText(const Options& options);
@@ -47,8 +47,9 @@ class DocumentProgress {
   std::optional<ProgressLine> _line;
 };
 
-// How messages and results name an input.
+// How results name an input, and how messages do, where it must not look like a message of its own.
 std::string inputName(const std::string& path);
+std::string shownName(const std::string& path);
 
 // The variables and documents that the options bind; throws Failure.
 xquery::XQueryConstants bindConstants(const Options& options);

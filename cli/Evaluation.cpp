@@ -48,10 +48,11 @@ Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
   throw Failure{StatusQueryError, descriptions(*errors), list(*errors)};
 }
 
-Evaluation::Evaluation(const Options& options)
+Evaluation::Evaluation(const Options& options, std::shared_ptr<XQueryClient> client)
     : _context(XQueryContext::xqueryContextWithNamespaces(options.namespaces)) {
   _context->contextSetLoading(loading(options));
   _context->contextSetLimits(limits(options));
+  _context->contextSetClient(std::move(client));
 }
 
 Ref<NSArray> Evaluation::evaluate(const XQuery& query, const XQueryConstants& constants,

@@ -5,6 +5,8 @@
 #include "xquery/xquery.h"
 
 #include <functional>
+#include <memory>
+#include <utility>
 
 namespace cli {
 
@@ -17,7 +19,8 @@ xquery::Ref<xquery::XQuery> compile(const Options& options,
 // Failure; a value that is an error counts as one wherever it stands.
 class Evaluation {
  public:
-  explicit Evaluation(const Options& options);
+  // The client may be null.
+  Evaluation(const Options& options, std::shared_ptr<xquery::XQueryClient> client);
   xquery::Ref<xquery::NSArray> evaluate(const xquery::XQuery& query,
                                         const xquery::XQueryConstants& constants,
                                         const xquery::Value& contextItem);

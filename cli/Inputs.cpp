@@ -6,7 +6,10 @@
 #include <filesystem>
 #include <iterator>
 #include <string_view>
+#include <sys/stat.h>
 #include <system_error>
+#include <unistd.h>
+#include <utility>
 
 namespace cli {
 namespace {
@@ -79,15 +82,54 @@ void addInput(const Options& options, const std::string& path, std::vector<Input
   }
 }
 
+// Takes what is before the separator off the text, and the separator.
+std::string_view takeName(std::string_view& text, char separator) {
+  const size_t end = std::min(text.find(separator), text.size());
+  const std::string_view name = text.substr(0, end);
+  text.remove_prefix(std::min(end + 1, text.size()));
+  return name;
+}
+
+// Whether a carriage return ends every line that is not empty, as in lists from other systems. In
+// any other list it belongs to a name.
+bool endsLinesWithReturns(std::string_view list) {
+  bool hasLines = false;
+  while (!list.empty()) {
+    const std::string_view line = takeName(list, '\n');
+    if (line.empty()) continue;
+    if (!line.ends_with('\r')) return false;
+    hasLines = true;
+  }
+  return hasLines;
+}
+
 // One with a zero in it has a zero behind each name.
 void addList(const Options& options, const std::string& list, std::vector<Input>& inputs) {
-  const std::string text = list == "-" ? readStandardInput() : readFile(list);
-  const char separator = text.find('\0') == text.npos ? '\n' : '\0';
-  for (std::string_view rest = text; !rest.empty();) {
-    const size_t end = std::min(rest.find(separator), rest.size());
-    if (end > 0) addInput(options, std::string(rest.substr(0, end)), inputs);
-    rest.remove_prefix(std::min(end + 1, rest.size()));
+  constexpr size_t mostBytes = size_t{1} << 30;
+  constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
+  const std::string text = readFile(list, mostBytes);
+  std::string_view rest = text;
+  const bool hasZeros = text.find('\0') != text.npos;
+  if (!hasZeros && rest.starts_with(byteOrderMark)) rest.remove_prefix(byteOrderMark.size());
+  const bool hasReturns = !hasZeros && endsLinesWithReturns(rest);
+  while (!rest.empty()) {
+    std::string_view name = takeName(rest, hasZeros ? '\0' : '\n');
+    if (hasReturns && !name.empty()) name.remove_suffix(1);
+    if (!name.empty()) addInput(options, std::string(name), inputs);
   }
+}
+
+void keepOneReader(const Options& options, std::vector<Input>& inputs) {
+  bool isTaken = isReadBesideInputs(options);
+  for (Input& input : inputs) {
+    if (input.path == "-" && std::exchange(isTaken, true)) {
+      input.failure = "can be read only once";
+    }
+  }
+}
+
+bool isSameFile(const struct stat& a, const struct stat& b) {
+  return a.st_dev == b.st_dev && a.st_ino == b.st_ino;
 }
 
 }  // namespace
@@ -97,11 +139,26 @@ bool isNamedXML(const std::string& path) {
   return withoutEnding(unpacked, endingsOfXML) != unpacked;
 }
 
+bool isNamedDocument(const std::string& path, bool html) {
+  const std::string_view unpacked = withoutEnding(std::string_view(path), packings);
+  return isNamedXML(path) || (html && withoutEnding(unpacked, endingsOfHTML) != unpacked);
+}
+
 std::vector<Input> inputsOf(const Options& options) {
   std::vector<Input> inputs;
   for (const std::string& path : options.inputs) addInput(options, path, inputs);
   if (options.filesFrom) addList(options, *options.filesFrom, inputs);
+  keepOneReader(options, inputs);
   return inputs;
+}
+
+void refuseOutputAsInput(const Options& options, const std::string& path) {
+  struct stat output, input;
+  if (options.outputFile || fstat(STDOUT_FILENO, &output) != 0 || !S_ISREG(output.st_mode)) return;
+  const bool isThere =
+      (path == "-" ? fstat(STDIN_FILENO, &input) : stat(path.c_str(), &input)) == 0;
+  if (!isThere || !isSameFile(input, output)) return;
+  throw Failure{StatusInput, "xquery: " + shownName(path) + ": this is where the output goes", {}};
 }
 
 }  // namespace cli

@@ -2,6 +2,7 @@
 
 #include "HTMLWriter.h"
 #include "JSON.h"
+#include "Messages.h"
 
 #include <algorithm>
 #include <iterator>
@@ -23,6 +24,14 @@ std::string valueOf(const NSObject& item) {
     text += digits[value & 15];
   }
   return text;
+}
+
+// XML has no place for most control characters.
+bool isPlainText(const std::string& name) {
+  const bool hasControls = std::any_of(name.begin(), name.end(), [](char byte) {
+    return (byte >= 0 && byte < 0x20 && byte != '\t' && byte != '\n') || byte == 0x7F;
+  });
+  return !hasControls && NSString::stringWithUTF8(name);
 }
 
 // Numbers and booleans are those of JSON, but for what it has none for, such as NaN.
@@ -70,6 +79,12 @@ void ItemWriter::writeItem(const NSObject& item) {
   }
 }
 
+std::string ItemWriter::documentedInputName() const {
+  if (isPlainText(_inputName)) return _inputName;
+  const Ref<NSURL> URL = NSURL::fileURLWithPath(_inputName);
+  return URL ? URL->absoluteString()->utf8() : visibleName(_inputName);
+}
+
 // --- lines ---------------------------------------------------------------------------------------
 
 void ItemWriter::writeLine(const NSObject& item) {
@@ -108,8 +123,7 @@ void ItemWriter::writeXML(const NSXMLNode& node) {
 void ItemWriter::writeAttribute(const char* name, const std::string& value) {
   const Ref<NSString> text = NSString::stringWithUTF8(value);
   _result.append(" ");
-  writeXML(*NSXMLNode::attributeWithName(NSStringView::ascii(name),
-                                         text ? text->view() : NSStringView::ascii("?"), {}));
+  writeXML(*NSXMLNode::attributeWithName(NSStringView::ascii(name), text->view(), {}));
 }
 
 // An element for each item. Attributes and what else has no place in content are written as text,
@@ -117,7 +131,7 @@ void ItemWriter::writeAttribute(const char* name, const std::string& value) {
 void ItemWriter::writeXMLItem(const NSObject& item) {
   _result.append("<item");
   writeAttribute("type", XQueryItemTypeName(item));
-  if (_options.withName) writeAttribute("input", _inputName);
+  if (_options.withName) writeAttribute("input", documentedInputName());
   const auto* node = item.isNode() ? cast<NSXMLNode>(&item) : nullptr;
   const bool isProperty =
       node && (node->kind() == Kind::Attribute || node->kind() == Kind::Namespace);
@@ -141,7 +155,7 @@ void ItemWriter::writeXMLItem(const NSObject& item) {
 void ItemWriter::writeJSONItem(const NSObject& item) {
   const std::string type = XQueryItemTypeName(item);
   _result.append("{\"type\":" + jsonString(type));
-  if (_options.withName) _result.append(",\"input\":" + jsonString(_inputName));
+  if (_options.withName) _result.append(",\"input\":" + jsonString(documentedInputName()));
   _result.append(",\"value\":" + jsonValue(type, valueOf(item)));
   if (item.isNode()) {
     const auto* node = cast<NSXMLNode>(&item);

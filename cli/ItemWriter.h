@@ -25,6 +25,8 @@ class ItemWriter {
   void write(const xquery::NSObject& item);
 
  private:
+  // A name that XML and JSON cannot hold, such as one that is not UTF-8, is given as its URL.
+  std::string documentedInputName() const;
   void writeItem(const xquery::NSObject& item);
   void writeLine(const xquery::NSObject& item);
   void writeValue(const xquery::NSObject& item);

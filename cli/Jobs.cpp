@@ -3,6 +3,8 @@
 #include "Documents.h"
 #include "Evaluation.h"
 #include "ItemWriter.h"
+#include "Messages.h"
+#include "MissingDocuments.h"
 #include "Reports.h"
 #include "Results.h"
 #include "Signals.h"
@@ -46,7 +48,7 @@ class Jobs {
   void work();
   void makePart(size_t number, Phases& phases);
   Ref<NSArray> resultOf(const Input* input, Phases& phases) const;
-  // What is said about one of several inputs names it.
+  // What is said about one of several inputs names it, and what is said to a program always.
   std::string reported(const Input* input, const Failure& failure) const;
 
   const Options& _options;
@@ -60,6 +62,7 @@ class Jobs {
   std::atomic<size_t> _next = 0;
   std::mutex _mutex;
   Phases& _phases;
+  const std::shared_ptr<MissingDocuments> _missing = std::make_shared<MissingDocuments>(_options);
 };
 
 // This thread works too, so that all is done even where no other can be started.
@@ -75,7 +78,7 @@ Status Jobs::run() {
   for (const pthread_t thread : threads) pthread_join(thread, nullptr);
   endIfInterrupted();
   if (_results.finish(_parts)) return status();
-  const std::string name = _options.outputFile.value_or("standard output");
+  const std::string name = visibleName(_options.outputFile.value_or("standard output"));
   throw Failure{StatusInput, "xquery: cannot write " + name + ": " + _results.error(), {}};
 }
 
@@ -118,13 +121,14 @@ void Jobs::makePart(size_t number, Phases& phases) {
 
 Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) const {
   if (input && !input->failure.empty()) {
-    throw Failure{StatusInput, "xquery: " + input->path + ": " + input->failure, {}};
+    throw Failure{StatusInput, "xquery: " + shownName(input->path) + ": " + input->failure, {}};
   }
+  if (input) refuseOutputAsInput(_options, input->path);
   const Value contextItem = phases.parse.measure([&]() -> Value {
     if (!input) return nullptr;
     return readDocument(_options, input->path, _options.html ? Markup::HTML : Markup::XML);
   });
-  Evaluation evaluation(_options);
+  Evaluation evaluation(_options, _missing);
   Ref<NSArray> items;
   for (unsigned n = 0; n < _options.repeat; n++) {
     items = nullptr;
@@ -136,7 +140,8 @@ Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) const {
 }
 
 std::string Jobs::reported(const Input* input, const Failure& failure) const {
-  return report(_options, failure, _parts > 1 ? inputName(input->path) : "");
+  const bool isNamed = input && (_parts > 1 || _options.format == Format::JSON);
+  return report(_options, failure, isNamed ? inputName(input->path) : "");
 }
 
 }  // namespace

@@ -108,6 +108,10 @@ std::string visible(std::string_view utf8) {
   return visibleBut("\t\n", utf8);
 }
 
+std::string visibleName(std::string_view utf8) {
+  return visibleBut("", utf8);
+}
+
 std::string description(const NSError& error) {
   const std::string whole = error.description()->utf8();
   const auto* own = dyn_cast<XQueryError>(&error);

@@ -13,6 +13,9 @@ namespace cli {
 // and line feeds stay.
 std::string visible(std::string_view utf8);
 
+// The same, with tabs and line feeds made visible too: what names something stands within a line.
+std::string visibleName(std::string_view utf8);
+
 // An error's description to the letter, apart from control characters and from what it quotes of
 // the query: no more than 200 characters of the source line, around the place, and of the token.
 std::string description(const xquery::NSError& error);

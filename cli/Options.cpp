@@ -22,7 +22,8 @@ constexpr const char* footer =
     "QUERYFILE is a file in UTF-8; -e gives the query itself. INPUT is the document that becomes "
     "the\n"
     "context item, \"-\" stands for standard input; without INPUT there is no context item. With\n"
-    "several INPUTs, or a folder of them, the query is evaluated for each on its own.\n\n"
+    "several INPUTs, or a folder of them, the query is evaluated for each on its own. Without a\n"
+    "query, on a terminal, a session begins that asks for one after the other.\n\n"
     "Exit status: 0 for a result, 1 for an error in the query, 2 for wrong usage, 3 for input "
     "that\n"
     "cannot be read or parsed or output that cannot be written, 4 with --exit-status for a result\n"
@@ -62,8 +63,6 @@ void declareOption(CLI::App& app, const OptionRow& row) {
       option = app.add_flag(std::string(row.name) + "{" + words(row).front() + "}", row.help);
       break;
     case Takes::Value:
-      option = addTexts(app, row.name, row.help)->type_name(row.value);
-      break;
     case Takes::Values:
       option = addTexts(app, row.name, row.help)->type_name(row.value)->take_all();
       break;
@@ -109,7 +108,11 @@ std::vector<std::string> given(const CLI::App& app, const char* name) {
 
 void applyOptions(const CLI::App& app, Options& options) {
   for (const OptionRow& row : optionRows()) {
-    for (const std::string& value : given(app, row.name)) {
+    const std::vector<std::string> values = given(app, row.name);
+    if (row.takes == Takes::Value && values.size() > 1) {
+      throw WrongUsage(std::string(row.name) + " may be given only once");
+    }
+    for (const std::string& value : values) {
       if (row.takes == Takes::Nothing && value != "true") {
         throw WrongUsage(std::string(row.name) + " takes no value");
       }
@@ -137,12 +140,17 @@ void checkTogether(const Options& options) {
   }
 }
 
-void checkStandardInput(const Options& options) {
-  auto readers = std::count(options.inputs.begin(), options.inputs.end(), "-");
-  readers += options.filesFrom == "-";
+ptrdiff_t readersBesideInputs(const Options& options) {
+  ptrdiff_t readers = options.filesFrom == "-";
   readers += !options.queryText && options.queryFile == "-";
   for (const Binding& document : options.documents) readers += document.value == "-";
-  if (readers > 1) throw WrongUsage("standard input can be read only once");
+  return readers;
+}
+
+void checkStandardInput(const Options& options) {
+  const auto inputs = std::count(options.inputs.begin(), options.inputs.end(), "-");
+  if (inputs + readersBesideInputs(options) > 1)
+    throw WrongUsage("standard input can be read only once");
 }
 
 // Help and the like are output as any other.
@@ -214,12 +222,27 @@ std::string unknownOption(const std::vector<std::string>& arguments) {
   return "unknown option " + wrong + (nearest.empty() ? "" : "; did you mean " + nearest + "?");
 }
 
+// The library's message begins with the option that stands without its value, unless the help does
+// not show it, which is so for one.
+std::string missingValue(const std::string& message) {
+  const std::string shown = message.substr(0, message.find(':'));
+  const std::string name = shown.empty() ? "--completions" : shown;
+  for (const OptionRow& row : optionRows()) {
+    if (name == row.name) return name + ": expected " + row.value;
+  }
+  return name + ": expected a value";
+}
+
 Status explain(const std::string& error) {
-  writeMessage("xquery: " + visible(error) + "\nTry xquery --help.\n");
+  writeMessage("xquery: " + visibleName(error) + "\nTry xquery --help.\n");
   return StatusUsage;
 }
 
 }  // namespace
+
+bool isReadBesideInputs(const Options& options) {
+  return readersBesideInputs(options) > 0;
+}
 
 std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
   CLI::App app("Evaluates an XQuery and writes each item of the result on a line of its own.");
@@ -237,6 +260,8 @@ std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
     return print(app, success);
   } catch (const CLI::ExtrasError&) {
     return explain(unknownOption(app.remaining()));
+  } catch (const CLI::ArgumentMismatch& error) {
+    return explain(missingValue(error.what()));
   } catch (const CLI::ParseError& error) {
     return explain(error.what());
   } catch (const WrongUsage& error) {

@@ -55,6 +55,7 @@ struct Options {
   unsigned repeat = 1;
   unsigned jobs = 0;  // 0: as many as there are processors
   bool withName = false;
+  bool isSession = false;  // queries come from the terminal, one after the other
   Format format = Format::Lines;
   bool indent = false;
   Color color = Color::Auto;
@@ -68,6 +69,9 @@ struct Options {
   // Without any there is no context item.
   bool hasInputs() const { return !inputs.empty() || filesFrom; }
 };
+
+// Whether standard input is the query, a list of inputs, or the document of a variable.
+bool isReadBesideInputs(const Options& options);
 
 // Fills `options`. A status means that the command ends here: help or version was printed, or the
 // usage was wrong and has been explained on standard error.

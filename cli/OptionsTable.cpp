@@ -148,25 +148,20 @@ void denyAll(const OptionRow&, const std::string&, Options& options) {
   options.policy = XQueryLoadingPolicy::denyAll();
 }
 
-// The library knows schemes and hosts, not pairs of them: two servers with different schemes would
-// allow two more.
-void allowServer(const OptionRow& row, const std::string& text, Options& options) {
+// What is below no URL, such as one with a user name, is not below itself either.
+void allowURLsBelow(const OptionRow& row, const std::string& text, Options& options) {
   const Ref<NSURL> URL = NSURL::URLWithString(NSString::stringWithUTF8(text));
-  const std::string scheme = URL ? URL->scheme() : "", host = URL ? URL->host() : "";
-  const bool isServer = text == scheme + "://" + host || text == scheme + "://" + host + "/";
-  if (host.empty() || !isServer || (scheme != "http" && scheme != "https")) {
-    refuse(row, "a folder, or a server as https://example.org/", text);
-  }
-  const std::string other = scheme == "http" ? "https" : "http";
-  if (options.policy.allowsScheme(other)) refuse(row, "a server with " + other, text);
-  options.policy.allowScheme(scheme).allowHost(host);
+  const bool isOnServer = URL && (URL->scheme() == "http" || URL->scheme() == "https") &&
+                          XQueryLoadingPolicy::denyAll().allowURLsBelow(text).allowsURL(*URL);
+  if (!isOnServer) refuse(row, "a folder, or a URL such as https://example.org/data/", text);
+  options.policy.allowURLsBelow(text);
 }
 
 void allow(const OptionRow& row, const std::string& text, Options& options) {
   if (!std::exchange(options.hasAllowed, true)) options.policy = XQueryLoadingPolicy::denyAll();
   std::error_code unknown;
   if (text.find("://") != text.npos) {
-    allowServer(row, text, options);
+    allowURLsBelow(row, text, options);
   } else if (std::filesystem::is_directory(text, unknown)) {
     options.policy.allowFilesBelow(text);
   } else {
@@ -230,7 +225,7 @@ constexpr OptionRow rows[] = {
     {ofLimits, "--deny-all", Takes::Nothing, "", Offers::Nothing,
      "Let the query load no files and nothing from the network", denyAll},
     {ofLimits, "--allow", Takes::Values, "FOLDER-or-URL", Offers::Folders,
-     "Let the query load what is below a folder, or from a server, and nothing else", allow},
+     "Let the query load what is below a folder or a URL, and nothing else", allow},
     {ofReports, "--check", Takes::Nothing, "", Offers::Nothing,
      "Compile the query and report its errors, without evaluating it", set<&Options::check>},
     {ofReports, "--plan", Takes::MaybeValue, "text|json|dot", Offers::Words,
@@ -243,7 +238,8 @@ constexpr OptionRow rows[] = {
     {ofReports, "--color", Takes::Value, "auto|always|never", Offers::Words,
      "Color messages: on a terminal, always or never", choose<&Options::color, Color>},
     {ofReports, "--quiet", Takes::Nothing, "", Offers::Nothing,
-     "Show no line about the progress of reading", set<&Options::quiet>},
+     "Show neither the progress of reading nor warnings of documents that cannot be loaded",
+     set<&Options::quiet>},
     {ofReports, "--progress", Takes::Nothing, "", Offers::Nothing,
      "Show that line for each of several inputs too", set<&Options::progress>},
 };

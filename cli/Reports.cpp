@@ -70,7 +70,25 @@ std::string asJSON(const Failure& failure, const std::string& input) {
 std::string report(const Options& options, const Failure& failure, const std::string& input) {
   if (options.format == Format::JSON) return asJSON(failure, input);
   const bool isNamed = !input.empty() && failure.status == StatusQueryError;
-  const std::string text = visible((isNamed ? input + ": " : "") + failure.message) + "\n";
+  const std::string text =
+      (isNamed ? visibleName(input) + ": " : "") + visible(failure.message) + "\n";
+  return usesColor(options) ? colored(text) : text;
+}
+
+std::string warning(const Options& options, const XQueryMissingDocument& document) {
+  const std::string what = "cannot load " + document.URL + ": " + document.reason;
+  if (options.format == Format::JSON) {
+    return "{\"warning\":" + jsonString(what) + ",\"url\":" + jsonString(document.URL) +
+           ",\"reason\":" + jsonString(document.reason) + "}\n";
+  }
+  const std::string text = "xquery: warning: " + visibleName(what) + "\n";
+  return usesColor(options) ? colored(text) : text;
+}
+
+std::string warningOfMore(const Options& options) {
+  const std::string what = "more documents cannot be loaded";
+  if (options.format == Format::JSON) return "{\"warning\":" + jsonString(what) + "}\n";
+  const std::string text = "xquery: warning: " + what + "\n";
   return usesColor(options) ? colored(text) : text;
 }
 

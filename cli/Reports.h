@@ -12,4 +12,8 @@ namespace cli {
 // inputs failed; empty where there is no need to say.
 std::string report(const Options& options, const Failure& failure, const std::string& input = {});
 
+// The same about a document that could not be had, and that there are more of them.
+std::string warning(const Options& options, const xquery::XQueryMissingDocument& document);
+std::string warningOfMore(const Options& options);
+
 }  // namespace cli

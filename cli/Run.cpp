@@ -4,6 +4,7 @@
 #include "Evaluation.h"
 #include "Inputs.h"
 #include "Jobs.h"
+#include "Messages.h"
 #include "Output.h"
 #include "Reports.h"
 #include "Signals.h"
@@ -22,7 +23,7 @@ void printPlan(const Options& options, const XQuery& query) {
   const std::string plan = options.stream ? XQueryStreamDescription(query)
                                           : query.planDescription(*options.plan)->utf8();
   if (output.open(options.outputFile) && output.append(plan) && output.finish()) return;
-  const std::string name = options.outputFile.value_or("standard output");
+  const std::string name = visibleName(options.outputFile.value_or("standard output"));
   throw Failure{StatusInput, "xquery: cannot write " + name + ": " + output.error(), {}};
 }
 

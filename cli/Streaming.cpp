@@ -2,8 +2,10 @@
 
 #include "Documents.h"
 #include "Evaluation.h"
+#include "Inputs.h"
 #include "ItemWriter.h"
 #include "Messages.h"
+#include "MissingDocuments.h"
 #include "OptionsTable.h"
 #include "Reports.h"
 #include "Results.h"
@@ -34,6 +36,7 @@ class Stream {
   std::optional<Failure> evaluate(const XQueryConstants& constants);
   bool receive(const Value& item);
   void beginOnce();
+  std::string nameForReport() const;
   Status finish(const std::optional<Failure>& failure);
 
   const Options& _options;
@@ -52,7 +55,8 @@ Status Stream::run(const XQueryConstants& constants, Phases& phases) {
 
 // The line of progress is gone when it ends.
 std::optional<Failure> Stream::evaluate(const XQueryConstants& constants) {
-  Evaluation evaluation(_options);
+  refuseOutputAsInput(_options, _path);
+  Evaluation evaluation(_options, std::make_shared<MissingDocuments>(_options));
   DocumentProgress progress(_options, _path);
   XQueryStreamInput input;
   input.path = _path;
@@ -87,6 +91,10 @@ void Stream::beginOnce() {
   _hasBegun = true;
 }
 
+std::string Stream::nameForReport() const {
+  return _options.format == Format::JSON ? inputName(_path) : "";
+}
+
 Status Stream::finish(const std::optional<Failure>& failure) {
   if (interruption()->load()) {
     _results.stop();
@@ -94,14 +102,14 @@ Status Stream::finish(const std::optional<Failure>& failure) {
   }
   if (failure) {
     _results.flush();
-    _part.end(failure->status, report(_options, *failure));
+    _part.end(failure->status, report(_options, *failure, nameForReport()));
     if (_options.outputFile) _results.stop();
   } else {
     beginOnce();
     _part.end();
   }
   if (!_results.finish(1)) {
-    const std::string name = _options.outputFile.value_or("standard output");
+    const std::string name = visibleName(_options.outputFile.value_or("standard output"));
     throw Failure{StatusInput, "xquery: cannot write " + name + ": " + _results.error(), {}};
   }
   if (failure) return failure->status;

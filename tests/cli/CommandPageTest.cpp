@@ -65,6 +65,19 @@ TEST(Completions, OfferWhatFitsInBash) {
       ". \"$0\"; COMP_WORDS=(xquery --as j); COMP_CWORD=2; _xquery; echo ${COMPREPLY[*]}; "
       "COMP_WORDS=(xquery --files); COMP_CWORD=1; _xquery; echo ${COMPREPLY[*]}";
   EXPECT_EQ(command::start("/bin/bash", {"-c", script, file}).out, "json\n--files-from\n");
+  // Bash breaks words at "=", unless it was told not to.
+  const std::pair<const char*, const char*> words[] = {
+      {"xquery --as = h", "html"},       {"xquery --as =", "lines xml html json text"},
+      {"xquery --plan = j", "json"},     {"xquery --color = al", "always"},
+      {"xquery --as=js", "--as=json"},   {"xquery --plan=d", "--plan=dot"},
+      {"xquery --plan --pla", "--plan"}, {"xquery --files-from = /etc/host", "/etc/hostname"},
+      {"xquery --allow = /et", "/etc"}};
+  for (const auto& [typed, offered] : words) {
+    const std::string one = ". \"$0\"; COMP_WORDS=(" + std::string(typed) +
+                            "); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _xquery; "
+                            "echo ${COMPREPLY[*]}";
+    EXPECT_THAT(command::start("/bin/bash", {"-c", one, file}).out, HasSubstr(offered)) << typed;
+  }
 }
 
 }  // namespace

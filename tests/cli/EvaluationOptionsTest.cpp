@@ -4,8 +4,10 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <csignal>
 #include <filesystem>
+#include <iterator>
 #include <sys/stat.h>
 
 using command::books;
@@ -139,11 +141,12 @@ TEST(LimitOptions, SayWhatMayBeLoaded) {
 
 TEST(LimitOptions, AreUnderstoodOrRefused) {
   const std::vector<std::string> wrong[] = {
-      {"--timeout", "0"},          {"--timeout", "-1"},     {"--timeout", "soon"},
-      {"--timeout", "nan"},        {"--memory", "0"},       {"--memory", "1T"},
-      {"--memory", "K"},           {"--memory", "1KB"},     {"--memory", "99999999999G"},
-      {"--allow", "/nowhere"},     {"--allow", "ftp://a/"}, {"--allow", "https://a/b"},
-      {"--allow", "https://a:1/"}, {"--color", "blue"}};
+      {"--timeout", "0"},          {"--timeout", "-1"},        {"--timeout", "soon"},
+      {"--timeout", "nan"},        {"--memory", "0"},          {"--memory", "1T"},
+      {"--memory", "K"},           {"--memory", "1KB"},        {"--memory", "99999999999G"},
+      {"--allow", "/nowhere"},     {"--allow", "ftp://a/"},    {"--allow", "https://u@a/b"},
+      {"--allow", "https://a:x/"}, {"--allow", "http://a/?q"}, {"--allow", "http://"},
+      {"--color", "blue"}};
   for (std::vector<std::string> arguments : wrong) {
     const std::string option = arguments.front();
     arguments.insert(arguments.end(), {"-e", "1"});
@@ -151,7 +154,7 @@ TEST(LimitOptions, AreUnderstoodOrRefused) {
     EXPECT_EQ(outcome.status, 2) << arguments[1];
     EXPECT_THAT(outcome.err, StartsWith("xquery: " + option + ": ")) << arguments[1];
   }
-  EXPECT_EQ(xquery({"--allow", "http://a/", "--allow", "https://b/", "-e", "1"}).status, 2);
+  EXPECT_EQ(xquery({"--allow", "http://a/", "--allow", "https://b:1/c", "-e", "1"}).out, "1\n");
 }
 
 // --- interrupts ----------------------------------------------------------------------------------
@@ -183,6 +186,55 @@ TEST(Interrupt, EndsTheEvaluationAndLeavesTheResultFileAsItWas) {
                     XQUERY_BINARY_DIR "/xquery", out, directory.path("pipe"), directory.path("")});
   EXPECT_EQ(outcome.out, "4\n130\n3\n");
   EXPECT_EQ(readFile(out), "kept");
+}
+
+// What asks the process to end finds it within whatever it does.
+TEST(Interrupt, EndsTheCommandByEverySignalThatIsMeantTo) {
+  const TemporaryDirectory directory;
+  const std::string out = directory.write("out", "kept");
+  const std::pair<const char*, const char*> signals[] = {
+      {"QUIT", "131\n"}, {"XCPU", "152\n"}, {"HUP", "129\n"}};
+  for (const auto& [signal, status] : signals) {
+    // While a result is being written to its new file; without a file of the process's memory.
+    const std::string script =
+        "ulimit -c 0; rm -f \"$2\"; mkfifo \"$2\"; echo '<a/>' > \"$2.xml\"; "
+        "env --default-signal=" +
+        std::string(signal) +
+        " \"$0\" --jobs 1 -o \"$1\" -e '/' \"$2.xml\" \"$2\" & pid=$!; sleep 0.5; "
+        "ls -A \"$3\" | wc -l; kill -" +
+        signal + " $pid; wait $pid; echo $?; ls -A \"$3\" | wc -l";
+    const Outcome outcome =
+        command::start("/bin/bash", {"-mc", script, XQUERY_BINARY_DIR "/xquery", out,
+                                     directory.path("pipe"), directory.path("")});
+    EXPECT_EQ(outcome.out, "4\n" + std::string(status) + "3\n") << signal;
+  }
+  EXPECT_EQ(readFile(out), "kept");
+}
+
+// One thread evaluates, the other one waits for an input that does not come.
+TEST(Interrupt, EndsTheCommandWhileAnotherThreadReads) {
+  const TemporaryDirectory directory;
+  const std::string input = directory.write("a.xml", "<a/>");
+  const Outcome outcome = command::start(
+      "/bin/bash",
+      {"-mc",
+       "mkfifo \"$2\"; env --default-signal=INT \"$0\" --jobs 2 -e '" + std::string(endless) +
+           "' \"$1\" \"$2\" & pid=$!; sleep 0.7; kill -INT $pid; wait $pid; echo $?",
+       XQUERY_BINARY_DIR "/xquery", input, directory.path("pipe")});
+  EXPECT_EQ(outcome.out, "130\n");
+}
+
+// The end of the process by its own message still takes the new file away.
+TEST(Interrupt, LeavesNoFileBehindWhenNobodyReadsItsMessages) {
+  const TemporaryDirectory directory;
+  const std::string out = directory.write("out", "kept"), a = directory.write("a.xml", "<a/>");
+  const Outcome outcome = command::start(
+      "xquery", {"--jobs", "1", "-o", out, "-e", "/", a, directory.path("none.xml"), a}, "",
+      command::Sink::Captured, command::Sink::ClosedPipe);
+  EXPECT_EQ(outcome.status, -SIGPIPE);
+  EXPECT_EQ(readFile(out), "kept");
+  const auto files = std::filesystem::directory_iterator(directory.path(""));
+  EXPECT_EQ(std::distance(begin(files), end(files)), 2);
 }
 
 // --- messages ------------------------------------------------------------------------------------

@@ -97,6 +97,16 @@ INSTANTIATE_TEST_SUITE_P(
         WrongUsage{"NoQuery", {}, "QUERYFILE"},
         WrongUsage{"StandardInputTwice", {"-e", "1", "-", "-"}, "standard input"},
         WrongUsage{"StandardInputAsListToo", {"-e", "1", "-", "--files-from", "-"}, "only once"},
+        WrongUsage{
+            "ValueMissing", {"-e", "1", "--as"}, "--as: expected lines|xml|html|json|text\n"},
+        WrongUsage{"NameMissing", {"-e", "1", "--var"}, "xquery: --var: expected NAME=VALUE\n"},
+        WrongUsage{"ShellMissing", {"--completions"}, "xquery: --completions: expected a value\n"},
+        WrongUsage{"FormatTwice",
+                   {"--as", "xml", "--as=json", "-e", "1"},
+                   "xquery: --as may be given only once\n"},
+        WrongUsage{"LineFeedInAValue",
+                   {"--repeat", "1\nxquery: all is well", "-e", "1"},
+                   "not \"1\\u000Axquery: all is well\"\n"},
         WrongUsage{"NoJobs", {"-e", "1", "--jobs", "0"}, "--jobs: expected a number from 1"},
         WrongUsage{"TextWithoutText", {"-e"}, "-e"},
         WrongUsage{"TextTwice", {"-e", "1", "-e", "2"}, "-e"},
@@ -137,6 +147,20 @@ TEST(ExitStatus, ADirectoryAsQueryFileIsThree) {
   const Outcome outcome = xquery({directory.path("")});
   EXPECT_EQ(outcome.status, 3);
   EXPECT_EQ(outcome.err, "xquery: " + directory.path("") + ": Is a directory\n");
+}
+
+// The memory is bounded as well, so that a machine is not filled by mistake.
+TEST(ExitStatus, AQueryFileWithoutEndIsThree) {
+  const Outcome endless = xquery({"/dev/zero"});
+  EXPECT_EQ(endless.status, 3);
+  EXPECT_EQ(endless.err, "xquery: /dev/zero: longer than 64 MiB\n");
+  EXPECT_LT(endless.mostMemory, size_t{300} << 20);
+  const Outcome piped = command::shell("yes '(: more :)' | \"$0\" -");
+  EXPECT_EQ(piped.err, "xquery: standard input: longer than 64 MiB\n");
+  const TemporaryDirectory directory;
+  const std::string most(size_t{64} << 20, ' ');
+  EXPECT_EQ(xquery({directory.write("most.xq", most)}).status, 0);
+  EXPECT_EQ(xquery({directory.write("more.xq", most + " ")}).status, 3);
 }
 
 TEST(ExitStatus, AQueryFileThatIsNotUTF8IsThree) {

@@ -108,6 +108,14 @@ TEST(Formats, ErrorsAreJSONWithAnArray) {
                           "\",\"status\":1}\n{\"message\":\"xquery: /nowhere: No such file or "
                           "directory\",\"input\":\"/nowhere\",\"status\":3}\n");
   EXPECT_EQ(both.status, 3);
+  // A program wants to know of a single input too, and of a stream.
+  const std::string named = "{\"code\":6,\"message\":\"divide by zero\",\"line\":1,\"input\":\"";
+  EXPECT_EQ(xquery({"--as", "json", "-e", "1 idiv 0", file}).err,
+            named + file + "\",\"status\":1}\n");
+  EXPECT_EQ(xquery({"--as", "json", "--stream", "-e", "for $b in /a/b return 1 idiv 0", file}).err,
+            named + file + "\",\"status\":1}\n");
+  EXPECT_EQ(xquery({"--as", "json", "-e", "1 idiv 0", "-"}, "<a/>").err,
+            named + "standard input\",\"status\":1}\n");
 }
 
 }  // namespace

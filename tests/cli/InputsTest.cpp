@@ -95,6 +95,71 @@ TEST_F(Inputs, MayBeNamedInAList) {
   EXPECT_EQ(missing.status, 3);
 }
 
+TEST_F(Inputs, MayBeNamedInAListOfAnotherSystem) {
+  const std::string a = write("a.xml", 1), b = write("b.xml", 2), c = write("c.xml\r", 3);
+  const std::string query = "//text()", mark = "\xEF\xBB\xBF";
+  EXPECT_EQ(xquery({"-e", query, "--files-from", list(mark + a + "\r\n\r\n" + b)}).status, 3)
+      << "a line without a return";
+  EXPECT_EQ(xquery({"-e", query, "--files-from", list(mark + a + "\r\n\r\n" + b + "\r\n")}).out,
+            "1\n2\n");
+  EXPECT_EQ(xquery({"-e", query, "--files-from", list(a + "\n" + c + "\n")}).out, "1\n3\n");
+  const std::string zeros = a + std::string(1, '\0') + c + std::string(1, '\0');
+  EXPECT_EQ(xquery({"-e", query, "--files-from", list(zeros)}).out, "1\n3\n");
+}
+
+TEST_F(Inputs, ReadStandardInputOnce) {
+  const std::string a = write("a.xml", 1);
+  const std::string names = list("-\n" + a + "\n-\n");
+  const Outcome outcome = xquery({"-e", "//text()", "--files-from", names}, "<a>0</a>");
+  EXPECT_EQ(outcome.out, "0\n1\n");
+  EXPECT_EQ(outcome.err, "xquery: standard input: can be read only once\n");
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_EQ(xquery({"-e", "//text()", "--files-from", "-"}, a + "\n-\n").err,
+            "xquery: standard input: can be read only once\n");
+  EXPECT_EQ(xquery({"-", "--files-from", list("-\n")}, "1").err,
+            "xquery: standard input: can be read only once\n");
+}
+
+TEST_F(Inputs, AreNotWhereTheOutputGoes) {
+  const std::string a = write("a.xml", 1), b = write("b.xml", 2);
+  const Outcome outcome = shell("\"$0\" -e '//text()' \"$1\" \"$2\" >> \"$1\"", {a, b});
+  EXPECT_EQ(outcome.err, "xquery: " + a + ": this is where the output goes\n");
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_EQ(command::readFile(a), "<a>1</a>2\n");
+  EXPECT_EQ(shell("\"$0\" --stream -e '/a/b' \"$1\" >> \"$1\"", {b}).err,
+            "xquery: " + b + ": this is where the output goes\n");
+  EXPECT_EQ(shell("\"$0\" -e '/a' - < \"$1\" > \"$1\"", {b}).err,
+            "xquery: standard input: this is where the output goes\n");
+}
+
+// A name must not look like a message, or a result, of its own.
+TEST_F(Inputs, HaveNamesThatStayWithinAMessage) {
+  const std::string folder = path("");
+  const std::string name = "x\nxquery: all is well";
+  const std::string shown = folder + "x\\u000Axquery: all is well";
+  write(name, 0);
+  EXPECT_EQ(xquery({"-e", "1", path(name) + "?"}).err,
+            "xquery: " + shown + "?: No such file or directory\n");
+  EXPECT_EQ(xquery({"-e", "1 idiv xs:integer(/)", path(name), write("b", 1)}).err,
+            shown + ": XQueryError:6 - \"divide by zero\" at line:1\n");
+  EXPECT_EQ(xquery({path("q\ty")}).err,
+            "xquery: " + folder + "q\\u0009y: No such file or directory\n");
+  EXPECT_EQ(xquery({"-e", "1", "-o", path("none\n/x")}).err,
+            "xquery: cannot write " + folder + "none\\u000A/x: No such file or directory\n");
+}
+
+TEST_F(Inputs, ThatAreNoTextAreNamedByTheirUrl) {
+  const std::string file = write("\xFF%.xml", 1), URL = "file://" + path("%FF%25.xml");
+  EXPECT_THAT(xquery({"--as", "xml", "--with-name", "-e", "1", file}).out,
+              HasSubstr(" input=\"" + URL + "\""));
+  EXPECT_THAT(xquery({"--as", "json", "--with-name", "-e", "1", file}).out,
+              HasSubstr("\"input\":\"" + URL + "\""));
+  EXPECT_EQ(xquery({"--with-name", "-e", "1", file}).out, file + "\t1\n");
+  const std::string control = write("\x01.xml", 1);
+  EXPECT_THAT(xquery({"--as", "xml", "--with-name", "-e", "1", control}).out,
+              HasSubstr("/%01.xml\""));
+}
+
 TEST_F(Inputs, ThatFailAreReportedAndTheOthersGoOn) {
   const std::string a = write("a", 1), b = write("b", 0), c = write("c", 4);
   const std::string query = "8 idiv xs:integer(/a)";
