@@ -1,6 +1,7 @@
 #include "Options.h"
 
 #include "Completions.h"
+#include "Inputs.h"
 #include "Messages.h"
 #include "OptionsTable.h"
 #include "Output.h"
@@ -13,6 +14,7 @@
 #include <memory>
 #include <sstream>
 #include <string_view>
+#include <unistd.h>
 #include <utility>
 
 namespace cli {
@@ -34,7 +36,8 @@ class Help : public CLI::Formatter {
  public:
   std::string make_usage(const CLI::App*, std::string) const override {
     return "Usage: xquery [options] QUERYFILE [INPUT...]\n"
-           "       xquery [options] -e QUERY [INPUT...]\n";
+           "       xquery [options] -e QUERY [INPUT...]\n"
+           "       xquery [options] [INPUT.xml]\n";
   }
   // The value belongs to the name where it may be left out.
   std::string make_option_name(const CLI::Option* option, bool isPositional) const override {
@@ -121,10 +124,35 @@ void applyOptions(const CLI::App& app, Options& options) {
   }
 }
 
+// A terminal where a query is expected and none is named: a document is none by its name.
+bool beginsSession(const Options& options) {
+  if (!isatty(STDIN_FILENO) || !isatty(STDOUT_FILENO) || options.inputs.size() > 1) return false;
+  return options.inputs.empty() || isNamedDocument(options.inputs.front(), options.html);
+}
+
+// What is about one query, or about its only result, has no meaning then.
+void checkSession(const Options& options) {
+  const std::pair<bool, const char*> wrong[] = {{options.outputFile.has_value(), "-o"},
+                                                {options.filesFrom.has_value(), "--files-from"},
+                                                {options.jobs > 0, "--jobs"},
+                                                {options.stream, "--stream"},
+                                                {options.check, "--check"},
+                                                {options.plan.has_value(), "--plan"},
+                                                {options.exitStatus, "--exit-status"}};
+  for (const auto& [isGiven, name] : wrong) {
+    if (isGiven) throw WrongUsage(std::string(name) + ": QUERYFILE or -e QUERY is required");
+  }
+  for (const Binding& document : options.documents) {
+    if (document.value == "-") throw WrongUsage("--doc: standard input is the session's own");
+  }
+}
+
 // Gives the positional arguments their meaning.
 void interpretArguments(const CLI::App& app, Options& options) {
   options.inputs = given(app, "arguments");
   if (options.queryText) return;
+  options.isSession = beginsSession(options);
+  if (options.isSession) return;
   if (options.inputs.empty()) throw WrongUsage("QUERYFILE or -e QUERY is required");
   options.queryFile = options.inputs.front();
   options.inputs.erase(options.inputs.begin());
@@ -142,7 +170,7 @@ void checkTogether(const Options& options) {
 
 ptrdiff_t readersBesideInputs(const Options& options) {
   ptrdiff_t readers = options.filesFrom == "-";
-  readers += !options.queryText && options.queryFile == "-";
+  readers += !options.queryText && !options.isSession && options.queryFile == "-";
   for (const Binding& document : options.documents) readers += document.value == "-";
   return readers;
 }
@@ -253,6 +281,7 @@ std::optional<Status> parseOptions(int argc, char** argv, Options& options) {
     const std::vector<std::string>& shell = app.get_option("--completions")->results();
     if (!shell.empty()) return printCompletions(shell.front());
     interpretArguments(app, options);
+    if (options.isSession) checkSession(options);
     checkStandardInput(options);
     if (options.stream) checkStream(options);
     checkTogether(options);

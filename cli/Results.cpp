@@ -1,5 +1,6 @@
 #include "Results.h"
 
+#include "Signals.h"
 #include "Streams.h"
 
 #include <algorithm>
@@ -48,6 +49,11 @@ void Results::flush() {
   if (_isOpen) _output.flush();
 }
 
+bool Results::endsLine() {
+  const std::lock_guard lock(_mutex);
+  return _output.endsLine();
+}
+
 Status Results::status() {
   const std::lock_guard lock(_mutex);
   return _status;
@@ -58,6 +64,7 @@ Status Results::status() {
 bool Results::beginWriting(bool hasItems) {
   if (!_isOpen) {
     _isOpen = true;
+    if (_options.isSession) _output.makeVisible();
     if (!_output.open(_options.outputFile) || !_output.append(_framing.opening)) return false;
   }
   if (!hasItems) return true;
@@ -66,6 +73,11 @@ bool Results::beginWriting(bool hasItems) {
 }
 
 bool Results::write(std::string_view text) {
+  // A session goes on when its result is not wanted any more.
+  if (_options.isSession && interruption()->load()) {
+    _output.discard();
+    return false;
+  }
   return _output.append(text);
 }
 

@@ -37,6 +37,8 @@ class Results {
   std::string error();
   // What has been written goes to its reader; for streams, which have one part.
   void flush();
+  // Whether what was written ends with a line.
+  bool endsLine();
   // The gravest that a part ended with.
   Status status();
   // No part goes on, and what was to be written to a file is not.

@@ -7,6 +7,7 @@
 #include "Messages.h"
 #include "Output.h"
 #include "Reports.h"
+#include "Session.h"
 #include "Signals.h"
 #include "Streaming.h"
 #include "Streams.h"
@@ -54,7 +55,7 @@ Status runPhases(const Options& options) {
 
 Status run(const Options& options) {
   try {
-    return runPhases(options);
+    return options.isSession ? runSession(options) : runPhases(options);
   } catch (const Failure& failure) {
     endIfInterrupted();
     writeMessage(report(options, failure));

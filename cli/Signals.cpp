@@ -10,12 +10,15 @@ namespace {
 
 std::atomic<bool>* raised = nullptr;
 std::atomic<int> underWay = 0;
+std::atomic<bool> survivesInterrupts = false;
 
 static_assert(std::atomic<bool>::is_always_lock_free && std::atomic<int>::is_always_lock_free);
 
 void handle(int signal) {
   const int error = errno;
-  if (signal != SIGINT || underWay == 0 || raised->exchange(true)) {
+  if (signal == SIGINT && survivesInterrupts) {
+    raised->store(true);
+  } else if (signal != SIGINT || underWay == 0 || raised->exchange(true)) {
     endBySignal(signal);
   }
   errno = error;
@@ -33,6 +36,10 @@ void handleSignals() {
     action.sa_flags = SA_RESTART;
     sigaction(signal, &action, nullptr);
   }
+}
+
+void surviveInterrupts() {
+  survivesInterrupts = true;
 }
 
 const std::shared_ptr<std::atomic<bool>>& interruption() {

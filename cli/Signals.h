@@ -12,6 +12,9 @@ namespace cli {
 // Called once. A signal that the parent has the command ignore stays ignored.
 void handleSignals();
 
+// From now on interrupts end no more than the evaluation that is under way.
+void surviveInterrupts();
+
 // Raised by the first interrupt while something is under way.
 const std::shared_ptr<std::atomic<bool>>& interruption();
 

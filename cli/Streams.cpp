@@ -8,6 +8,7 @@
 #include <limits.h>
 #include <poll.h>
 #include <pthread.h>
+#include <termios.h>
 #include <unistd.h>
 
 namespace cli {
@@ -15,6 +16,8 @@ namespace {
 
 char temporary[PATH_MAX];
 std::atomic<bool> hasTemporary = false;
+termios terminal;
+std::atomic<bool> hasTerminal = false;
 
 }  // namespace
 
@@ -36,12 +39,20 @@ void removeAtEnd(const std::string& path) {
   hasTemporary = true;
 }
 
+void restoreTerminalAtEnd() {
+  hasTerminal = tcgetattr(STDIN_FILENO, &terminal) == 0;
+}
+
 void endOfClosedPipe() {
   endBySignal(SIGPIPE);
 }
 
 void endBySignal(int signal) {
   if (hasTemporary) unlink(temporary);
+  if (hasTerminal) {
+    std::signal(SIGTTOU, SIG_IGN);  // which stops who is in the background
+    tcsetattr(STDIN_FILENO, TCSANOW, &terminal);
+  }
   std::signal(signal, SIG_DFL);
   sigset_t one;
   sigemptyset(&one);

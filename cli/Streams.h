@@ -22,6 +22,9 @@ void prepareStandardStreams();
 // The file that must not be left behind by a process that ends so; an empty path for none.
 void removeAtEnd(const std::string& path);
 
+// The terminal on standard input is left by a process that ends so as it is now.
+void restoreTerminalAtEnd();
+
 // Ends the process as the signal does that nobody handles; also from within its handler.
 [[noreturn]] void endBySignal(int signal);
 
