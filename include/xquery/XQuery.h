@@ -44,7 +44,7 @@ using XQueryConstants = std::map<std::string, Value>;
 enum class XQueryWay : uint8_t {
   Planned,  // unless the environment variable XQUERY_PLAN is "0" when the query is compiled
   Plain,
-  Explained,  // planned whatever the environment says, and the plan can be looked at
+  Explained,  // planned whatever the environment says; plan and warnings can be looked at
   Streamed,   // planned, to be evaluated record by record; where that cannot be done the query has
               // the compile error 0 "cannot be evaluated as a stream: " and the reason
 };

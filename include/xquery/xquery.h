@@ -15,4 +15,5 @@
 #include "xquery/String.h"
 #include "xquery/URL.h"
 #include "xquery/XMLNode.h"
+#include "xquery/Warnings.h"
 #include "xquery/XQuery.h"

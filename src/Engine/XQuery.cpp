@@ -125,6 +125,10 @@ Ref<NSArray> XQuery::parseErrors() const {
   return NSArray::arrayWithObjects(std::vector<Value>(errors.begin(), errors.end()));
 }
 
+std::vector<XQueryWarning> XQueryWarnings(const XQuery& query) {
+  return query._internal().warnings();
+}
+
 Ref<NSString> XQuery::planDescription(XQueryPlanFormat format) const {
   const XQueryPlanReport* report = _private->planReport();
   if (!report) return {};

@@ -1,5 +1,6 @@
 #include "Engine/XQueryInternal.h"
 
+#include "Check/Check.h"
 #include "Parser/XQueryParser.h"
 #include "Plan/Plan.h"
 #include "Platform/Loading/NSURLLoader.h"
@@ -19,13 +20,16 @@ XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource, const XQuery
   // An empty query has no module: no prolog items and no body.
   std::vector<Ref<XQueryPrologItem>> items;
   Ref<NSString> version;
+  XQueryRemarks remarks;
   if (const auto& module = parser->parsedModule()) {
     items = module->prologItems();
     version = module->version();
+    remarks = module->remarks();
     _body = module->body();
   }
   _prolog = XQueryProlog::prologWithItems(items, nullptr, nullptr, version,
                                           NSURLLoader::loaderWithLoading(loading));
+  _prolog->setRemarks(std::move(remarks));
   // Local variable IDs of the main body start at 1.
   _prolog->setNextLocalVariableID(1);
   if (_body) _body->bindInfoForProlog(*_prolog);
@@ -37,6 +41,7 @@ void XQueryInternal::plan(XQueryWay way) {
   if (way == XQueryWay::Streamed) {
     planStream();
   } else if (way == XQueryWay::Explained) {
+    _warnings = XQueryCheckedProgram(*_prolog, _body);
     auto report = std::make_unique<XQueryPlanReport>();
     _body = XQueryPlanned(*_prolog, _body, *report);
     _planReport = std::move(report);

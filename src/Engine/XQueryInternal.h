@@ -6,6 +6,7 @@
 #include "xquery/Error.h"
 #include "xquery/Loading.h"
 #include "xquery/String.h"
+#include "xquery/Warnings.h"
 #include "xquery/XQuery.h"
 
 #include <memory>
@@ -33,6 +34,8 @@ class XQueryInternal {
   bool isError() const { return !_errors.empty(); }
   // Of a query that was compiled to be explained, and without errors; else null.
   const XQueryPlanReport* planReport() const { return _planReport.get(); }
+  // Of a query that was compiled to be explained, in the order of its text.
+  const std::vector<XQueryWarning>& warnings() const { return _warnings; }
   // Of a query that was compiled to be streamed, and without errors; else null.
   const XQueryStreamProgram* streamProgram() const { return _streamProgram.get(); }
 
@@ -44,6 +47,7 @@ class XQueryInternal {
   Ref<XQueryExpr> _body;
   std::vector<Ref<XQueryError>> _errors;
   std::unique_ptr<const XQueryPlanReport> _planReport;
+  std::vector<XQueryWarning> _warnings;
   std::unique_ptr<const XQueryStreamProgram> _streamProgram;
 };
 

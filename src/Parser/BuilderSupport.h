@@ -21,6 +21,13 @@ NSObject* XQAtLine(Ref<T> expr, int64_t line) {
   return XQueryParserAutoRelease(std::move(expr));
 }
 
+// Notes what the expressions will not tell; the names may be null.
+inline void XQRemark(XQueryRemark::Matter matter, int64_t line, NSObject* first = nullptr,
+                     NSObject* second = nullptr) {
+  XQueryParser::currentParser()->remark(
+      {matter, line, XQRef<NSString>(first), XQRef<NSString>(second)});
+}
+
 inline NSObject* XQList(NSObject* item) {
   Ref<NSArray> list = NSArray::array();
   if (item) list->objects().emplace_back(item);

@@ -106,7 +106,6 @@ NSObject* XQOrderedExpr(NSObject* expr, bool ordered, int64_t line);
 NSObject* XQFunctionCall(NSObject* name, NSObject* args, int64_t line);
 NSObject* XQFunctionArgs(NSObject* expr);
 NSObject* XQFunctionArgsAdd(NSObject* args, NSObject* expr);
-// No expression at all: there is no validation.
 // Nothing is validated: the empty sequence, whatever stands in the braces.
 NSObject* XQValidateExpr(int64_t line);
 NSObject* XQOperatorLeft(NSObject* expr);
@@ -141,6 +140,8 @@ NSObject* XQTypeNameWildCard();
 NSObject* XQAnyKindTest(int64_t line);
 // The type and the nillable mark have no effect: nothing is ever validated.
 NSObject* XQElementTest(NSObject* name, NSObject* type, bool nillable, int64_t line);
+// Notes schema-element(NAME) and schema-attribute(NAME), which are tests of the name.
+void XQSchemaTest(NSObject* name, int64_t line);
 NSObject* XQAttributeTest(NSObject* name, NSObject* type, int64_t line);
 NSObject* XQPITest(NSObject* target, int64_t line);
 NSObject* XQDocumentTest(NSObject* elementTest, int64_t line);
@@ -157,6 +158,10 @@ NSObject* XQSequenceType(NSObject* type, int occurrenceToken);
 
 NSObject* XQElementConstructor(NSObject* name, NSObject* attributes, NSObject* content,
                                int64_t line);
+// Notes an end tag that has another name than the start tag.
+void XQEndTag(NSObject* startName, NSObject* endName, int64_t line);
+// Notes a reference to a tab or a line end, which an attribute does not keep.
+void XQCharRefInAttribute(char16_t unit, int64_t line);
 NSObject* XQAttributeList(NSObject* item);
 NSObject* XQAttributeListAdd(NSObject* list, NSObject* item);
 NSObject* XQAttributeListItem(NSObject* name, NSObject* items, int quoteToken, int64_t line);

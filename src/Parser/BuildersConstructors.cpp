@@ -64,6 +64,16 @@ NSObject* XQElementConstructor(NSObject* name, NSObject* attributes, NSObject* c
                   line);
 }
 
+void XQEndTag(NSObject* startName, NSObject* endName, int64_t line) {
+  if (cast<NSString>(startName)->isEqualToString(*cast<NSString>(endName))) return;
+  XQRemark(XQueryRemark::Matter::EndTag, line, startName, endName);
+}
+
+void XQCharRefInAttribute(char16_t unit, int64_t line) {
+  const bool isKept = unit != u'\t' && unit != u'\n' && unit != u'\r';
+  if (!isKept) XQRemark(XQueryRemark::Matter::LineEndReference, line);
+}
+
 NSObject* XQAttributeList(NSObject* item) {
   return XQList(item);
 }
@@ -78,6 +88,11 @@ NSObject* XQAttributeListItem(NSObject* name, NSObject* items, int quoteToken, i
   const Ref<NSString> attributeName = XQRef<NSString>(name);
   const NSStringView text = attributeName->view();
   const NSStringView declaration = NSStringView::ascii("xmlns:");
+  const bool isDeclaration = text == "xmlns" || text.startsWith(declaration);
+  const bool isLiteral = values.empty() || (values.size() == 1 && isa<XQueryLiteral>(values[0]));
+  if (isDeclaration && !isLiteral) {
+    XQRemark(XQueryRemark::Matter::EnclosedNamespace, line, attributeName.get());
+  }
   if (text == "xmlns") return XQAtLine(namespaceDeclaration(NSString::empty(), values), line);
   if (text.startsWith(declaration)) {
     const auto prefix = NSString::stringWithView(text.substring(declaration.length()));

@@ -299,6 +299,7 @@ NSObject* XQFunctionArgsAdd(NSObject* args, NSObject* expr) {
 }
 
 NSObject* XQValidateExpr(int64_t line) {
+  XQRemark(XQueryRemark::Matter::Validate, line);
   return XQEmptyLiteral(line);
 }
 

@@ -73,11 +73,13 @@ NSObject* XQDeclareInheritNamespaces(bool inherit, int64_t line) {
 }
 
 NSObject* XQDeclareDefaultCollation(NSObject* URI, int64_t line) {
+  XQRemark(XQueryRemark::Matter::DefaultCollation, line, URI);
   return XQueryParserAutoRelease(
       XQueryPrologItemDefaultCollation::collation(XQRef<NSString>(URI), line));
 }
 
 NSObject* XQDeclareDefaultBaseURI(NSObject* URI, int64_t line) {
+  XQRemark(XQueryRemark::Matter::BaseURI, line, URI);
   return XQueryParserAutoRelease(
       XQueryPrologItemDefaultBaseURI::baseURI(XQRef<NSString>(URI), line));
 }
@@ -115,11 +117,13 @@ NSObject* XQModuleImport(NSObject* URI, NSObject* locations, NSObject* prefix, i
 }
 
 NSObject* XQSchemaImport(NSObject* URI, NSObject* locations, NSObject* prefix, int64_t line) {
+  XQRemark(XQueryRemark::Matter::SchemaImport, line, URI);
   return XQueryParserAutoRelease(XQueryPrologItemSchemaImport::schemaImport(
       XQRef<NSString>(URI), locationsOf(locations), XQRef<NSString>(prefix), line));
 }
 
 NSObject* XQSchemaImportDefaultElement(NSObject* URI, NSObject* locations, int64_t line) {
+  XQRemark(XQueryRemark::Matter::SchemaImport, line, URI);
   return XQueryParserAutoRelease(XQueryPrologItemSchemaImportDefaultElement::defaultElement(
       XQRef<NSString>(URI), locationsOf(locations), line));
 }

@@ -32,11 +32,17 @@ NSObject* XQAnyKindTest(int64_t line) {
   return XQAtLine(XQueryTypeDeclaration::anyKind(), line);
 }
 
-NSObject* XQElementTest(NSObject* name, NSObject*, bool, int64_t line) {
+void XQSchemaTest(NSObject* name, int64_t line) {
+  XQRemark(XQueryRemark::Matter::SchemaTest, line, name);
+}
+
+NSObject* XQElementTest(NSObject* name, NSObject* type, bool, int64_t line) {
+  if (type) XQRemark(XQueryRemark::Matter::TypeInTest, line, type);
   return XQAtLine(XQueryTypeDeclaration::element(Value(name)), line);
 }
 
-NSObject* XQAttributeTest(NSObject* name, NSObject*, int64_t line) {
+NSObject* XQAttributeTest(NSObject* name, NSObject* type, int64_t line) {
+  if (type) XQRemark(XQueryRemark::Matter::TypeInTest, line, type);
   return XQAtLine(XQueryTypeDeclaration::attribute(Value(name)), line);
 }
 

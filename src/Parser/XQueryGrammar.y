@@ -1112,16 +1112,28 @@ DirElemConstructor:
       { $$ = XQValue($1.line, XQElementConstructor($2.value, nullptr, nullptr, $1.line)); }
   | kTokenLessThanConstructor kTokenQName DirAttributeList kTokenGreaterThan DirElementContent
         kTokenLessThanSolidus kTokenQName kTokenGreaterThan
-      { $$ = XQValue($1.line, XQElementConstructor($2.value, $3.value, $5.value, $1.line)); }
+      {
+        XQEndTag($2.value, $7.value, $7.line);
+        $$ = XQValue($1.line, XQElementConstructor($2.value, $3.value, $5.value, $1.line));
+      }
   | kTokenLessThanConstructor kTokenQName kTokenGreaterThan DirElementContent kTokenLessThanSolidus
         kTokenQName kTokenGreaterThan
-      { $$ = XQValue($1.line, XQElementConstructor($2.value, nullptr, $4.value, $1.line)); }
+      {
+        XQEndTag($2.value, $6.value, $6.line);
+        $$ = XQValue($1.line, XQElementConstructor($2.value, nullptr, $4.value, $1.line));
+      }
   | kTokenLessThanConstructor kTokenQName DirAttributeList kTokenGreaterThan kTokenLessThanSolidus
         kTokenQName kTokenGreaterThan
-      { $$ = XQValue($1.line, XQElementConstructor($2.value, $3.value, nullptr, $1.line)); }
+      {
+        XQEndTag($2.value, $6.value, $6.line);
+        $$ = XQValue($1.line, XQElementConstructor($2.value, $3.value, nullptr, $1.line));
+      }
   | kTokenLessThanConstructor kTokenQName kTokenGreaterThan kTokenLessThanSolidus kTokenQName
         kTokenGreaterThan
-      { $$ = XQValue($1.line, XQElementConstructor($2.value, nullptr, nullptr, $1.line)); }
+      {
+        XQEndTag($2.value, $5.value, $5.line);
+        $$ = XQValue($1.line, XQElementConstructor($2.value, nullptr, nullptr, $1.line));
+      }
   ;
 
 DirAttributeList:
@@ -1183,6 +1195,10 @@ AttributeValueChar:
   | kTokenCurlyBraceRightCurlyBraceRight
   | kTokenPredefinedEntityRef
   | kTokenCharRef
+      {
+        XQCharRefInAttribute($1.unit, $1.line);
+        $$ = $1;
+      }
   ;
 
 DirElementContent:
@@ -1479,6 +1495,7 @@ ElementTest:
 SchemaElementTest:
     kTokenSchemaElementParenLeft kTokenQName kTokenParenRight
       {
+        XQSchemaTest($2.value, $1.line);
         $$ = XQValue($1.line, XQElementTest(XQNodeName($2.value, $2.line), nullptr, false,
             $1.line));
       }
@@ -1495,7 +1512,10 @@ AttributeTest:
 
 SchemaAttributeTest:
     kTokenSchemaAttributeParenLeft kTokenQName kTokenParenRight
-      { $$ = XQValue($1.line, XQAttributeTest(XQNodeName($2.value, $2.line), nullptr, $1.line)); }
+      {
+        XQSchemaTest($2.value, $1.line);
+        $$ = XQValue($1.line, XQAttributeTest(XQNodeName($2.value, $2.line), nullptr, $1.line));
+      }
   ;
 
 PITest:

@@ -128,7 +128,9 @@ void XQueryParser::parse() {
 // A failed run may leave what an unfinished rule had built.
 void XQueryParser::runGrammar() {
   _scanner->XQueryScannerInit(XQueryStateDEFAULT);
-  if (XQparse(*this) == 0) _parsedModule = cast<XQueryParsedModule>(_result);
+  if (XQparse(*this) != 0) return;
+  _parsedModule = cast<XQueryParsedModule>(_result);
+  if (_parsedModule) _parsedModule->setRemarks(std::move(_remarks));
 }
 
 // The source without a byte order mark at its start.

@@ -59,6 +59,8 @@ class XQueryParser : public NSCounted {
   XQueryScanner& scanner() { return *_scanner; }
   // The value of the grammar's start symbol: a module, or null for a query of nothing.
   void setResult(NSObject* module) { _result = module; }
+  // Notes what the expressions will not tell.
+  void remark(XQueryRemark remark) { _remarks.push_back(std::move(remark)); }
   // The second declaration of one kind is an error at its line; an unknown flag is ignored.
   void XQueryParserSetSetterFlag(unsigned flag, int64_t line);
   // Keeps the object alive until the parse ends. One token may complete any number of expressions,
@@ -108,6 +110,7 @@ class XQueryParser : public NSCounted {
   size_t _position = 0;
   bool _hasUTF8String = false;
   unsigned _setterFlags = 0;
+  XQueryRemarks _remarks;
   NSObject* _result = nullptr;  // owned by the pool
   std::unique_ptr<XQueryScanner> _scanner;
   Counted<Value> _pool;

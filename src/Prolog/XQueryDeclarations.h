@@ -10,6 +10,7 @@
 #include "Types/XQueryQName.h"
 #include "xquery/String.h"
 
+#include <cstdint>
 #include <utility>
 #include <vector>
 
@@ -33,6 +34,14 @@ class XQueryVarDecl : public NSCounted {
   void setExpr(Ref<XQueryExpr> expr) { _expr = std::move(expr); }
   XQueryProlog& prolog() const { return _prolog; }
   bool isExternal() const { return !_expr; }
+  // Where it is declared: the name as written, without a dollar sign, null until set, and the line,
+  // counted from 0.
+  const Ref<NSString>& writtenName() const { return _writtenName; }
+  int64_t line() const { return _line; }
+  void setWritten(Ref<NSString> name, int64_t line) {
+    _writtenName = std::move(name);
+    _line = line;
+  }
 
  protected:
   XQueryVarDecl(Ref<XQueryQName> name, Ref<XQueryTypeDeclaration> type, Ref<XQueryExpr> expr,
@@ -45,6 +54,8 @@ class XQueryVarDecl : public NSCounted {
   Ref<XQueryTypeDeclaration> _type;
   Ref<XQueryExpr> _expr;
   XQueryProlog& _prolog;
+  Ref<NSString> _writtenName;
+  int64_t _line = 0;
 };
 
 // A parameter of a declared function.
@@ -96,6 +107,14 @@ class XQueryFunctionDecl : public NSCounted {
   void setExpr(Ref<XQueryExpr> expr) { _expr = std::move(expr); }
   XQueryProlog& prolog() const { return _prolog; }
   bool isExternal() const { return !_expr; }
+  // Where it is declared: the name as written, without a dollar sign, null until set, and the line,
+  // counted from 0.
+  const Ref<NSString>& writtenName() const { return _writtenName; }
+  int64_t line() const { return _line; }
+  void setWritten(Ref<NSString> name, int64_t line) {
+    _writtenName = std::move(name);
+    _line = line;
+  }
 
  protected:
   XQueryFunctionDecl(Ref<XQueryQName> name, Ref<XQueryTypeDeclaration> type,
@@ -110,6 +129,8 @@ class XQueryFunctionDecl : public NSCounted {
   std::vector<Ref<XQueryParam>> _params;
   Ref<XQueryExpr> _expr;
   XQueryProlog& _prolog;
+  Ref<NSString> _writtenName;
+  int64_t _line = 0;
 };
 
 }  // namespace xquery

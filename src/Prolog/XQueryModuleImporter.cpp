@@ -66,6 +66,7 @@ void XQueryModuleImporter::tryLocation(Importer& importer, const Ref<NSString>& 
   if (!module) return;
   auto prolog = make<XQueryProlog>(Ref<XQueryModules>(&modules));
   prolog->_start(module->prologItems(), location, module->version(), URL);
+  prolog->setRemarks(module->remarks());
   _importers.push_back({std::move(prolog)});
 }
 

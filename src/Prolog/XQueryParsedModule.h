@@ -4,10 +4,12 @@
 
 #include "Expr/XQueryExpr.h"
 #include "Prolog/XQueryPrologItems.h"
+#include "Prolog/XQueryRemark.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -26,6 +28,9 @@ class XQueryParsedModule : public NSCounted {
   const std::vector<Ref<XQueryPrologItem>>& prologItems() const { return _prologItems; }
   const Ref<XQueryExpr>& body() const { return _body; }
   const Ref<NSString>& version() const { return _version; }
+  // In the order in which they were read.
+  const XQueryRemarks& remarks() const { return _remarks; }
+  void setRemarks(XQueryRemarks remarks) { _remarks = std::move(remarks); }
 
  protected:
   XQueryParsedModule(std::vector<Ref<XQueryPrologItem>> prologItems, Ref<XQueryExpr> body,
@@ -41,6 +46,7 @@ class XQueryParsedModule : public NSCounted {
   std::vector<Ref<XQueryPrologItem>> _prologItems;
   Ref<XQueryExpr> _body;
   Ref<NSString> _version;
+  XQueryRemarks _remarks;
 };
 
 struct XQueryParse {

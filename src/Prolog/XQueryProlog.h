@@ -3,6 +3,7 @@
 
 #include "Prolog/StringTable.h"
 #include "Prolog/XQueryNamespaceStack.h"
+#include "Prolog/XQueryRemark.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
@@ -13,6 +14,7 @@
 
 #include <cstdint>
 #include <unordered_map>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -96,6 +98,10 @@ class XQueryProlog : public NSCounted {
   const std::vector<Ref<XQueryPrologItemSchemaImport>>& schemaImports() const {
     return _schemaImports;
   }
+
+  // What the parser noted of the module's text.
+  const XQueryRemarks& remarks() const { return _remarks; }
+  void setRemarks(XQueryRemarks remarks) { _remarks = std::move(remarks); }
 
   // --- namespaces ------------------------------------------------------------------------------
   // The in-scope namespaces first (`fromProlog` false), then the declared prefixes. Null for an
@@ -215,6 +221,7 @@ class XQueryProlog : public NSCounted {
       _variables;
   std::unordered_map<XQueryFunctionSignature, Ref<XQueryFunctionDecl>, XQueryFunctionSignatureHash>
       _functions;
+  XQueryRemarks _remarks;
   size_t _adopterCount = 0;
   int64_t _nextLocalVariableID = 1;
   std::unordered_map<Ref<XQueryQName>, int64_t, XQueryQNameHash, XQueryQNameEqual>

@@ -139,7 +139,9 @@ void XQueryPrologItemVariableDeclaration::XQueryUpdateProlog(XQueryProlog& prolo
     addItemError(prolog, XQueryErrors::variableDeclaredTwice, *this);
     return;
   }
-  prolog.setVariableInfo(XQueryVarDecl::varDecl(qName, _type, _expr, prolog), qName);
+  auto declaration = XQueryVarDecl::varDecl(qName, _type, _expr, prolog);
+  declaration->setWritten(_varName, line());
+  prolog.setVariableInfo(std::move(declaration), qName);
 }
 
 void XQueryPrologItemFunctionDeclaration::XQueryUpdateProlog(XQueryProlog& prolog) {
@@ -168,8 +170,9 @@ void XQueryPrologItemFunctionDeclaration::XQueryUpdateProlog(XQueryProlog& prolo
     addItemError(prolog, XQueryErrors::functionDeclaredTwice, *this);
     return;
   }
-  prolog.setFunctionInfo(XQueryFunctionDecl::functionDecl(qName, _type, _paramList, _expr, prolog),
-                         signature);
+  auto declaration = XQueryFunctionDecl::functionDecl(qName, _type, _paramList, _expr, prolog);
+  declaration->setWritten(_name, line());
+  prolog.setFunctionInfo(std::move(declaration), signature);
 }
 
 void XQueryPrologItemDeclareValidationSchemaMode::XQueryUpdateProlog(XQueryProlog& prolog) {

@@ -18,7 +18,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-constexpr std::array<std::string_view, 16> rooms = {
+constexpr std::array<std::string_view, 17> rooms = {
     "Platform/Base",
     "Platform/Text",
     "Platform/Numbers",
@@ -33,6 +33,7 @@ constexpr std::array<std::string_view, 16> rooms = {
     "Expr",
     "Functions",
     "Plan",
+    "Check",
     "Parser",
     "Engine",
 };

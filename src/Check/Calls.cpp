@@ -1,0 +1,224 @@
+// Built-in functions that answer otherwise than in XQuery 1.0 for the arguments that they are given.
+#include "Check/Checking.h"
+#include "Expr/Paths/XQueryPath.h"
+#include "Expr/XQueryLeaves.h"
+#include "Functions/XQueryFunctionCall.h"
+#include "Types/XQueryTypeTable.h"
+#include "xquery/Number.h"
+
+#include <algorithm>
+#include <array>
+#include <cctype>
+#include <string>
+#include <string_view>
+
+namespace xquery {
+namespace {
+
+using ID = XQueryWarningID;
+using namespace XQueryItems;
+
+// The call of one function, with as many arguments as it takes.
+using Look = void (*)(XQueryChecking& checking, XQueryPlaceID call, std::string_view name);
+
+void lookAtSubsequence(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* start = dyn_cast<NSNumber>(checking.literalIn(checking.argument(call, 1)));
+  const XQueryPlaceID place = checking.argument(call, 1);
+  // -1 is a sign and a number.
+  const auto* sign = start ? nullptr : checking.inside<XQueryExpr>(place);
+  const bool isNegative = sign && sign->kind() == Kind::OperatorExpr &&
+                          checking.leftOperand(checking.program.withoutParentheses(place)) ==
+                              XQueryNoPlace &&
+                          checking.labelOf(place) == "-";
+  if (checking.argumentCount(call) != 3 || (!isNegative && !(start && start->doubleValue() < 1))) {
+    return;
+  }
+  checking.warn(call, ID::SubsequenceStart, {isNegative ? "a negative place" : checking.labelOf(place)});
+}
+
+void lookAtDeepEqual(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const XQueryFacts& first = checking.factsOf(checking.argument(call, 0));
+  const XQueryFacts& second = checking.factsOf(checking.argument(call, 1));
+  const auto holdsElements = [](const XQueryFacts& facts) {
+    return facts.most > 0 && facts.are(Node) && facts.mayBe(Element | Document);
+  };
+  if (holdsElements(first) && holdsElements(second)) checking.warn(call, ID::DeepEqual);
+}
+
+void lookAtIndexOf(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const XQueryFacts& sought = checking.factsOf(checking.argument(call, 1));
+  if (sought.most > 0 && sought.are(Node)) checking.warn(call, ID::IndexOfNode);
+}
+
+void lookAtID(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
+  checking.warn(call, ID::FindsNothing, {std::string(name)});
+}
+
+void lookAtCollection(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
+  checking.warn(call, ID::AbsentFunction, {std::string(name), "doc() for each document"});
+}
+
+bool isUntypedText(const XQueryChecking& checking, XQueryPlaceID place) {
+  const std::string_view name = checking.functionCalledIn(place);
+  return name == "concat" || name == "replace" || name == "tokenize";
+}
+
+void lookAtExtreme(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
+  const XQueryPlaceID items = checking.argument(call, 0);
+  const XQueryFacts& facts = checking.factsOf(items);
+  if (facts.most > 0 && facts.are(URI)) {
+    checking.warn(call, ID::AggregateOfURIs, {std::string(name)});
+  } else if (isUntypedText(checking, items)) {
+    checking.warn(call, ID::UntypedText, {std::string(checking.functionCalledIn(items)),
+                                          "is a number for " + std::string(name)});
+  }
+}
+
+void lookAtBaseURI(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const XQueryPlaceID node = checking.argument(call, 0);
+  if (node == XQueryNoPlace) return;
+  const XQueryFacts& facts = checking.factsOf(node);
+  if (facts.most > 0 && facts.are(Document)) checking.warn(call, ID::BaseURIOfDocument);
+}
+
+void lookAtNumber(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* text = checking.textIn(checking.argument(call, 0));
+  if (!text) return;
+  // Numbers begin with a sign, a digit or a point; what does not is NaN in both languages.
+  const std::string written = text->utf8();
+  const size_t first = written.find_first_not_of(" \t\r\n");
+  if (first == written.npos) return;
+  const std::string_view rest = std::string_view(written).substr(first);
+  const size_t digit = rest.find_first_not_of("+-.");
+  const bool begins = digit != rest.npos && digit < 3 && std::isdigit(static_cast<unsigned char>(rest[digit]));
+  const size_t end = rest.find_first_not_of("0123456789+-.eE \t\r\n");
+  if (!begins || end == rest.npos) return;
+  checking.warn(call, ID::NumberFromFront, {checking.labelOf(checking.argument(call, 0))});
+}
+
+void lookAtNormalForm(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* text = checking.textIn(checking.argument(call, 1));
+  if (!text || text->length() == 0) return;
+  constexpr std::array<std::string_view, 4> forms = {"NFC", "NFD", "NFKC", "NFKD"};
+  const std::string written = text->utf8();
+  if (std::find(forms.begin(), forms.end(), written) != forms.end()) return;
+  checking.warn(call, ID::NormalForm, {checking.labelOf(checking.argument(call, 1))});
+}
+
+// The first construct of a pattern that Perl reads otherwise; empty for none.
+std::string otherConstructIn(std::string_view pattern) {
+  bool isInClass = false;
+  for (size_t i = 0; i < pattern.size(); ++i) {
+    const std::string_view rest = pattern.substr(i);
+    if (rest.starts_with('\\')) {
+      for (const std::string_view escape : {"\\i", "\\I", "\\c", "\\C"}) {
+        if (rest.starts_with(escape)) return std::string(escape);
+      }
+      if (rest.starts_with("\\p{Is") || rest.starts_with("\\P{Is")) {
+        return std::string(rest.substr(0, rest.find('}')).substr(0, 40)) + "}";
+      }
+      ++i;
+    } else if (isInClass && rest.starts_with("-[")) {
+      return "-[";
+    } else if (rest.starts_with('[')) {
+      isInClass = true;
+    } else if (rest.starts_with(']')) {
+      isInClass = false;
+    }
+  }
+  return {};
+}
+
+void lookAtPattern(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* text = checking.textIn(checking.argument(call, 1));
+  const std::string construct = text ? otherConstructIn(text->utf8()) : std::string();
+  if (!construct.empty()) checking.warn(call, ID::PatternDiffers, {construct});
+}
+
+// A step behind an axis step is asked for each node by itself.
+void lookAtPosition(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
+  const XQueryPlaceID focus = checking.at(call).focus;
+  if (focus == XQueryNoPlace || checking.at(focus).role != XQueryRole::Step) return;
+  const auto* path = checking.as<XQueryPathExpr>(checking.at(focus).parent);
+  const XQueryStep* before = path ? path->step() : nullptr;
+  while (before && before->next() != checking.at(focus).step) before = before->next();
+  if (before && isa<XQueryAxisStep>(before)) {
+    checking.warn(call, ID::PositionInStep, {std::string(name)});
+  }
+}
+
+// Which argument is a collation.
+constexpr std::string_view codepointCollation =
+    "http://www.w3.org/2004/10/xpath-functions/collation/codepoint";
+constexpr std::string_view finalCodepointCollation =
+    "http://www.w3.org/2005/xpath-functions/collation/codepoint";
+
+struct Collated {
+  std::string_view name;
+  size_t index;
+};
+constexpr auto collated = std::to_array<Collated>({
+    {"compare", 2},
+    {"starts-with", 2},
+    {"ends-with", 2},
+    {"contains", 2},
+    {"substring-before", 2},
+    {"substring-after", 2},
+    {"index-of", 2},
+    {"deep-equal", 2},
+    {"distinct-values", 1},
+    {"max", 1},
+    {"min", 1},
+});
+
+void checkCollation(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
+  for (const Collated& row : collated) {
+    if (row.name != name) continue;
+    const XQueryPlaceID place = checking.argument(call, row.index);
+    if (place == XQueryNoPlace) return;
+    const auto* text = checking.textIn(place);
+    const std::string URI = text ? text->utf8() : std::string();
+    if (URI == codepointCollation || URI == finalCodepointCollation) return;
+    checking.warn(place, ID::Collation, {checking.labelOf(place)});
+  }
+}
+
+struct Row {
+  std::string_view name;
+  Look look;
+};
+
+constexpr auto rows = std::to_array<Row>({
+    {"subsequence", lookAtSubsequence},
+    {"deep-equal", lookAtDeepEqual},
+    {"index-of", lookAtIndexOf},
+    {"id", lookAtID},
+    {"idref", lookAtID},
+    {"collection", lookAtCollection},
+    {"max", lookAtExtreme},
+    {"min", lookAtExtreme},
+    {"sum", lookAtExtreme},
+    {"avg", lookAtExtreme},
+    {"base-uri", lookAtBaseURI},
+    {"number", lookAtNumber},
+    {"normalize-unicode", lookAtNormalForm},
+    {"matches", lookAtPattern},
+    {"replace", lookAtPattern},
+    {"tokenize", lookAtPattern},
+    {"position", lookAtPosition},
+    {"last", lookAtPosition},
+});
+
+}  // namespace
+
+void XQueryCheckBuiltInCall(XQueryChecking& checking, XQueryPlaceID place) {
+  const std::string_view name = checking.functionCalledIn(place);
+  const auto* builtIn = checking.as<XQueryFunctionCall>(place)->builtIn();
+  if (name.empty() || !builtIn->row().takes(checking.argumentCount(place))) return;
+  for (const Row& row : rows) {
+    if (row.name == name) row.look(checking, place, name);
+  }
+  checkCollation(checking, place, name);
+}
+
+}  // namespace xquery

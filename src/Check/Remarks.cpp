@@ -1,0 +1,97 @@
+// What the parser noted of each module, and the imports.
+#include "Prolog/XQueryRemark.h"
+
+#include "Check/Checking.h"
+#include "Prolog/XQueryProlog.h"
+#include "Prolog/XQueryPrologItems.h"
+
+#include <string>
+#include <unordered_set>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+using ID = XQueryWarningID;
+using Matter = XQueryRemark::Matter;
+
+std::string textOf(const Ref<NSString>& text) {
+  return text ? text->utf8() : std::string();
+}
+
+// Whether the result may begin with an element that the query makes.
+bool mayMakeElements(const XQueryChecking& checking) {
+  if (checking.program.bodies().empty()) return false;
+  const XQueryProgramBody& body = checking.program.bodies().back();
+  if (body.function || body.variable || body.place >= checking.program.placeCount()) return false;
+  const XQueryFacts& facts = checking.factsOf(body.place);
+  return facts.does(XQueryDeeds::MakesNodes) &&
+         facts.mayBe(XQueryItems::Element | XQueryItems::Document);
+}
+
+bool isCodepointCollation(const Ref<NSString>& URI) {
+  const std::string text = textOf(URI);
+  return text == "http://www.w3.org/2004/10/xpath-functions/collation/codepoint" ||
+         text == "http://www.w3.org/2005/xpath-functions/collation/codepoint";
+}
+
+void tell(XQueryChecking& checking, const XQueryProlog& module, const XQueryRemark& remark) {
+  const std::string first = textOf(remark.first);
+  const auto warn = [&](ID id, XQueryChecking::Parts parts = {}) {
+    checking.warnAt(module, remark.line, id, parts);
+  };
+  switch (remark.matter) {
+    case Matter::EndTag:
+      return warn(ID::EndTag, {first, textOf(remark.second)});
+    case Matter::EnclosedNamespace:
+      return warn(ID::EnclosedNamespace, {first});
+    case Matter::LineEndReference:
+      return warn(ID::LineEndReference);
+    case Matter::TypeInTest:
+      return warn(ID::TypeInTest, {first});
+    case Matter::SchemaTest:
+      return warn(ID::SchemaTest, {first});
+    case Matter::Validate:
+      return warn(ID::Validate);
+    case Matter::SchemaImport:
+      return warn(ID::SchemaImport, {first});
+    case Matter::DefaultCollation:
+      if (!isCodepointCollation(remark.first)) warn(ID::Collation, {"\"" + first + "\""});
+      return;
+    case Matter::BaseURI:
+      if (&module == &checking.main && mayMakeElements(checking)) warn(ID::BaseURI);
+      return;
+  }
+}
+
+// A module that has another namespace than its import names is imported all the same.
+void checkImports(XQueryChecking& checking, const XQueryProlog& module) {
+  for (const auto& import : module.moduleImports()) {
+    bool isThere = false;
+    for (const XQueryProlog* imported : module.importedModules()) {
+      const auto URI = imported->namespaceForPrefix(imported->modulePrefix()->view());
+      isThere = isThere || (URI && URI->isEqualToString(*import->namespaceString()));
+    }
+    if (isThere) continue;
+    checking.warnAt(module, import->line(), ID::ModuleNamespace,
+                    {textOf(import->namespaceString())});
+  }
+}
+
+}  // namespace
+
+void XQueryCheckRemarks(XQueryChecking& checking) {
+  std::unordered_set<const XQueryProlog*> seen{&checking.main};
+  std::vector<const XQueryProlog*> waiting{&checking.main};
+  while (!waiting.empty()) {
+    const XQueryProlog& module = *waiting.back();
+    waiting.pop_back();
+    for (const XQueryRemark& remark : module.remarks()) tell(checking, module, remark);
+    checkImports(checking, module);
+    for (const XQueryProlog* imported : module.importedModules()) {
+      if (seen.insert(imported).second) waiting.push_back(imported);
+    }
+  }
+}
+
+}  // namespace xquery
