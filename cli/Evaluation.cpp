@@ -39,9 +39,9 @@ std::vector<Ref<NSError>> list(const NSArray& errors) {
 
 Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
   const UnderWay compiling;
-  const XQueryWay way = options.stream ? XQueryWay::Streamed
-                        : options.plan ? XQueryWay::Explained
-                                       : XQueryWay::Planned;
+  const XQueryWay way = options.stream                  ? XQueryWay::Streamed
+                        : options.plan || options.check ? XQueryWay::Explained
+                                                        : XQueryWay::Planned;
   Ref<XQuery> query = XQuery::xqueryWithSource(source, loading(options), limits(options), way);
   const Ref<NSArray> errors = query->parseErrors();
   if (!errors || errors->count() == 0) return query;

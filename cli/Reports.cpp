@@ -92,4 +92,47 @@ std::string warningOfMore(const Options& options) {
   return usesColor(options) ? colored(text) : text;
 }
 
+namespace {
+
+// As the query or the module was named.
+std::string fileOf(const Options& options, const XQueryWarning& warning) {
+  if (!warning.module) return options.queryText ? "-e" : options.queryFile;
+  const Ref<NSURL> URL = NSURL::URLWithString(warning.module);
+  const bool isFile = URL && URL->scheme() == "file";
+  return isFile ? URL->path() : warning.module->utf8();
+}
+
+bool isExpected(const Options& options, const XQueryWarning& warning) {
+  return warning.identifier == "undeclared-prefix" && warning.name &&
+         options.namespaces.contains(warning.name->utf8());
+}
+
+std::string asJSON(const XQueryWarning& warning) {
+  std::string json = "{\"warning\":" + jsonString(warning.identifier) +
+                     ",\"message\":" + jsonString(warning.text->utf8());
+  if (warning.line > 0) json += ",\"line\":" + std::to_string(warning.line);
+  if (warning.column > 0) json += ",\"column\":" + std::to_string(warning.column);
+  if (warning.module) json += ",\"module\":" + jsonString(warning.module->utf8());
+  return json + "}\n";
+}
+
+std::string asText(const Options& options, const XQueryWarning& warning) {
+  std::string place = fileOf(options, warning) + ":" + std::to_string(warning.line) + ":";
+  if (warning.column > 0) place += std::to_string(warning.column) + ":";
+  const std::string head = usesColor(options) ? "\033[1;35mwarning:\033[0m " : "warning: ";
+  return visible(place) + " " + head + visible(warning.text->utf8()) + " [" +
+         std::string(warning.identifier) + "]\n";
+}
+
+}  // namespace
+
+std::string report(const Options& options, const std::vector<XQueryWarning>& warnings) {
+  std::string text;
+  for (const XQueryWarning& warning : warnings) {
+    if (isExpected(options, warning)) continue;
+    text += options.format == Format::JSON ? asJSON(warning) : asText(options, warning);
+  }
+  return text;
+}
+
 }  // namespace cli

@@ -28,11 +28,24 @@ void printPlan(const Options& options, const XQuery& query) {
   throw Failure{StatusInput, "xquery: cannot write " + name + ": " + output.error(), {}};
 }
 
+// Of a query without errors.
+void reportWarnings(const Options& options, const XQuery& query, const Ref<NSString>& source) {
+  if (options.quiet) return;
+  if (!options.stream) return writeMessage(report(options, XQueryWarnings(query)));
+  // What is compiled to be streamed tells why that cannot be, and nothing else.
+  Options whole = options;
+  whole.stream = false;
+  writeMessage(report(options, XQueryWarnings(*compile(whole, source))));
+}
+
 Status runPhases(const Options& options) {
   Phases phases;
   const Ref<NSString> source = queryText(options);
   const Ref<XQuery> query = phases.compile.measure([&] { return compile(options, source); });
-  if (options.check) return StatusResult;
+  if (options.check) {
+    reportWarnings(options, *query, source);
+    return StatusResult;
+  }
   if (options.plan) {
     printPlan(options, *query);
     return StatusResult;

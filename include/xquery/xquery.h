@@ -14,6 +14,6 @@
 #include "xquery/Stream.h"
 #include "xquery/String.h"
 #include "xquery/URL.h"
-#include "xquery/XMLNode.h"
 #include "xquery/Warnings.h"
+#include "xquery/XMLNode.h"
 #include "xquery/XQuery.h"

@@ -1,4 +1,5 @@
-// Built-in functions that answer otherwise than in XQuery 1.0 for the arguments that they are given.
+// Built-in functions that answer otherwise than in XQuery 1.0 for the arguments that they are
+// given.
 #include "Check/Checking.h"
 #include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLeaves.h"
@@ -26,14 +27,15 @@ void lookAtSubsequence(XQueryChecking& checking, XQueryPlaceID call, std::string
   const XQueryPlaceID place = checking.argument(call, 1);
   // -1 is a sign and a number.
   const auto* sign = start ? nullptr : checking.inside<XQueryExpr>(place);
-  const bool isNegative = sign && sign->kind() == Kind::OperatorExpr &&
-                          checking.leftOperand(checking.program.withoutParentheses(place)) ==
-                              XQueryNoPlace &&
-                          checking.labelOf(place) == "-";
+  const bool isNegative =
+      sign && sign->kind() == Kind::OperatorExpr &&
+      checking.leftOperand(checking.program.withoutParentheses(place)) == XQueryNoPlace &&
+      checking.labelOf(place) == "-";
   if (checking.argumentCount(call) != 3 || (!isNegative && !(start && start->doubleValue() < 1))) {
     return;
   }
-  checking.warn(call, ID::SubsequenceStart, {isNegative ? "a negative place" : checking.labelOf(place)});
+  checking.warn(call, ID::SubsequenceStart,
+                {isNegative ? "a negative place" : checking.labelOf(place)});
 }
 
 void lookAtDeepEqual(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
@@ -69,8 +71,9 @@ void lookAtExtreme(XQueryChecking& checking, XQueryPlaceID call, std::string_vie
   if (facts.most > 0 && facts.are(URI)) {
     checking.warn(call, ID::AggregateOfURIs, {std::string(name)});
   } else if (isUntypedText(checking, items)) {
-    checking.warn(call, ID::UntypedText, {std::string(checking.functionCalledIn(items)),
-                                          "is a number for " + std::string(name)});
+    checking.warn(
+        call, ID::UntypedText,
+        {std::string(checking.functionCalledIn(items)), "is a number for " + std::string(name)});
   }
 }
 
@@ -90,7 +93,8 @@ void lookAtNumber(XQueryChecking& checking, XQueryPlaceID call, std::string_view
   if (first == written.npos) return;
   const std::string_view rest = std::string_view(written).substr(first);
   const size_t digit = rest.find_first_not_of("+-.");
-  const bool begins = digit != rest.npos && digit < 3 && std::isdigit(static_cast<unsigned char>(rest[digit]));
+  const bool begins =
+      digit != rest.npos && digit < 3 && std::isdigit(static_cast<unsigned char>(rest[digit]));
   const size_t end = rest.find_first_not_of("0123456789+-.eE \t\r\n");
   if (!begins || end == rest.npos) return;
   checking.warn(call, ID::NumberFromFront, {checking.labelOf(checking.argument(call, 0))});

@@ -89,8 +89,8 @@ bool isBeyondClock(XQueryTypeID type, std::string_view text) {
   if (isDay && (text.starts_with("0000-") || text.starts_with("-0000-"))) return true;
   if (!isDay && !isTimeType(type)) return false;
   const size_t zone = text.size() > 6 ? text.size() - 6 : text.npos;
-  const bool hasZone = zone != text.npos && (text[zone] == '+' || text[zone] == '-') &&
-                       text[zone + 3] == ':';
+  const bool hasZone =
+      zone != text.npos && (text[zone] == '+' || text[zone] == '-') && text[zone + 3] == ':';
   if (hasZone && text.substr(zone + 1) > "14:00") return true;
   const size_t time = text.find(':');
   return isTimeType(type) && time != text.npos && text.substr(time + 3).starts_with(":60");
@@ -180,8 +180,8 @@ void checkLiteralCast(XQueryChecking& checking, XQueryPlaceID place, const Cast&
                       const NSObject& literal) {
   // A name takes its prefix from where it stands. Diagnostics show each error as it is made.
   if (cast.type == XQueryTypeQName || cast.type == XQueryTypeNotation || XQueryLogEnabled()) return;
-  const bool isPlain = literal.kind() == Kind::Null || isa<NSString>(&literal) ||
-                       isa<NSNumber>(&literal);
+  const bool isPlain =
+      literal.kind() == Kind::Null || isa<NSString>(&literal) || isa<NSNumber>(&literal);
   if (!isPlain) return;
   const Value value = valueOf(checking, place);
   if (!value) {
@@ -193,8 +193,7 @@ void checkLiteralCast(XQueryChecking& checking, XQueryPlaceID place, const Cast&
     checking.warn(place, ID::CastAccepts, {shown(checking, cast), cast.label});
   }
   const auto* text = dyn_cast<NSString>(&literal);
-  const bool isDuration =
-      cast.type == XQueryTypeDuration || cast.type == XQueryTypeDayTimeDuration;
+  const bool isDuration = cast.type == XQueryTypeDuration || cast.type == XQueryTypeDayTimeDuration;
   if (text && isDuration && hasLateFraction(text->utf8())) {
     checking.warn(place, ID::DurationFraction,
                   {shown(checking, cast), XQueryItemStringValue(*value)});
@@ -234,8 +233,8 @@ namespace {
 bool hasLoneHalf(NSStringView text) {
   for (uint32_t i = 0; i < text.length(); ++i) {
     if ((text[i] & 0xF800) != 0xD800) continue;
-    const bool isPair = (text[i] & 0xFC00) == 0xD800 && i + 1 < text.length() &&
-                        (text[i + 1] & 0xFC00) == 0xDC00;
+    const bool isPair =
+        (text[i] & 0xFC00) == 0xD800 && i + 1 < text.length() && (text[i + 1] & 0xFC00) == 0xDC00;
     if (!isPair) return true;
     ++i;
   }

@@ -1,6 +1,7 @@
 #include "Check/Check.h"
 
 #include "Check/Checking.h"
+#include "Check/Uses.h"
 #include "Platform/Base/WorkMeter.h"
 
 #include <array>
@@ -53,7 +54,7 @@ const Looks& looksByKind() {
   return table;
 }
 
-constexpr std::array<void (*)(XQueryChecking&), 5> wholes = {
+constexpr std::array<void (*)(XQueryChecking&, const XQueryUses&), 5> wholes = {
     XQueryCheckUnused,       XQueryCheckEmptyComparisons, XQueryCheckReverseOrder,
     XQueryCheckDeclarations, XQueryCheckRemarks,
 };
@@ -67,14 +68,15 @@ std::vector<XQueryWarning> XQueryCheckedProgram(const XQueryProlog& prolog,
   XQueryChecking checking(program, facts, prolog);
   const Looks& looks = looksByKind();
   WorkPacer pacer;
-  for (XQueryPlaceID place = 0; place < program.placeCount(); ++place) {
+  for (XQueryPlaceID place = 0; place < program.placeCount() && !checking.isFull(); ++place) {
     pacer.turn();
     for (const Look look : looks[static_cast<size_t>(program[place].expr->kind())]) {
       look(checking, place);
     }
     XQueryCheckTest(checking, place);
   }
-  for (const auto& look : wholes) look(checking);
+  const XQueryUses uses(checking);
+  for (const auto& look : wholes) look(checking, uses);
   return checking.takeWarnings();
 }
 

@@ -1,7 +1,8 @@
 // Checking: a bound program is gone over once, before it is planned, for what its author hardly
 // wants.
 //
-//   bound program --> places (Plan/Program.h) --> facts (Plan/FactsAnalysis.h) --> families, in turn
+//   bound program --> places (Plan/Program.h) --> facts (Plan/FactsAnalysis.h) --> families, in
+//   turn
 //
 // Each family of warnings is a file: Names, Unused, Conditions, Comparisons, Paths, Types,
 // Declarations, Casts, Calls, Clauses, Constructors, Remarks. WarningTable.h lists all warnings,

@@ -86,7 +86,7 @@ XQueryWarning XQueryChecking::warningOf(ID id, Parts parts, const Ref<NSString>&
 }
 
 void XQueryChecking::add(const XQueryProlog& module, XQueryPlaceID place, XQueryWarning warning) {
-  if (_found.size() >= mostWarnings) return;
+  if (isFull()) return;
   if (&module != &main && module.moduleURL()) warning.module = module.moduleURL()->absoluteString();
   _found.push_back({numberOf(module), place, std::move(warning)});
 }
@@ -155,6 +155,19 @@ const XQueryProgramBody* XQueryChecking::bodyOf(const XQueryFunctionDecl* functi
 const XQueryProgramBody* XQueryChecking::bodyOf(const XQueryVarDecl* variable) const {
   const auto found = _bodies.find(variable);
   return found == _bodies.end() ? nullptr : found->second;
+}
+
+const XQueryChecking::Functions& XQueryChecking::functionsNamed(const XQueryProlog& prolog,
+                                                                const std::string& localName) {
+  const auto [entry, isNew] = _functions.try_emplace(&prolog);
+  WorkPacer pacer;
+  for (const Value& declaration : prolog.declarations()) {
+    if (!isNew) break;
+    pacer.turn();
+    const auto* function = dyn_cast<XQueryFunctionDecl>(declaration);
+    if (function) entry->second[function->name()->localPart()->utf8()].push_back(function);
+  }
+  return entry->second[localName];
 }
 
 const NSObject* XQueryChecking::literalIn(XQueryPlaceID place) const {

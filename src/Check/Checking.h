@@ -16,6 +16,7 @@
 namespace xquery {
 
 class XQueryFunctionCall;
+class XQueryUses;
 
 class XQueryChecking {
  public:
@@ -36,6 +37,7 @@ class XQueryChecking {
   // The same at a line of a module, counted from 0, where no expression stands.
   void warnAt(const XQueryProlog& module, int64_t line, ID id, Parts parts = {},
               const Ref<NSString>& name = nullptr);
+  bool isFull() const { return _found.size() >= mostWarnings; }
   // What has been found, in order.
   std::vector<XQueryWarning> takeWarnings();
 
@@ -73,6 +75,10 @@ class XQueryChecking {
   const XQueryProgramBody* bodyOf(const XQueryFunctionDecl* function) const;
   const XQueryProgramBody* bodyOf(const XQueryVarDecl* variable) const;
 
+  // The functions of a local name that a module has declared or imported.
+  using Functions = std::vector<const XQueryFunctionDecl*>;
+  const Functions& functionsNamed(const XQueryProlog& prolog, const std::string& localName);
+
   const XQueryProgram& program;
   const XQueryFactTable& facts;
   const XQueryProlog& main;
@@ -93,6 +99,8 @@ class XQueryChecking {
   std::unordered_map<const XQueryProlog*, size_t> _modules;
   std::unordered_map<const NSObject*, const XQueryProgramBody*> _bodies;
   std::unordered_set<const XQueryExpr*> _waitingNames;
+  // Made for a module when it is first asked for.
+  std::unordered_map<const XQueryProlog*, std::unordered_map<std::string, Functions>> _functions;
 };
 
 // "a string", "strings or numbers": kinds of values for people.
@@ -120,10 +128,10 @@ void XQueryCheckQuantifier(XQueryChecking& checking, XQueryPlaceID place);
 void XQueryCheckElement(XQueryChecking& checking, XQueryPlaceID place);
 void XQueryCheckDocument(XQueryChecking& checking, XQueryPlaceID place);
 // Each looks at the whole program.
-void XQueryCheckUnused(XQueryChecking& checking);
-void XQueryCheckEmptyComparisons(XQueryChecking& checking);
-void XQueryCheckReverseOrder(XQueryChecking& checking);
-void XQueryCheckDeclarations(XQueryChecking& checking);
-void XQueryCheckRemarks(XQueryChecking& checking);
+void XQueryCheckUnused(XQueryChecking& checking, const XQueryUses& uses);
+void XQueryCheckEmptyComparisons(XQueryChecking& checking, const XQueryUses& uses);
+void XQueryCheckReverseOrder(XQueryChecking& checking, const XQueryUses& uses);
+void XQueryCheckDeclarations(XQueryChecking& checking, const XQueryUses& uses);
+void XQueryCheckRemarks(XQueryChecking& checking, const XQueryUses& uses);
 
 }  // namespace xquery

@@ -27,9 +27,7 @@ struct Sides {
   bool isGeneral;
 
   // As a value comparison.
-  int test() const {
-    return isGeneral ? type + (XQueryOperatorEq - XQueryOperatorEqual) : type;
-  }
+  int test() const { return isGeneral ? type + (XQueryOperatorEq - XQueryOperatorEqual) : type; }
   bool isEquality() const { return test() == XQueryOperatorEq || test() == XQueryOperatorNe; }
 };
 
@@ -84,8 +82,7 @@ bool isSameVariable(const XQueryChecking& checking, XQueryPlaceID a, XQueryPlace
 
 bool mayBeNaN(const XQueryChecking& checking, XQueryPlaceID place) {
   if (checking.functionCalledIn(place) != "number") return false;
-  const XQueryPlaceID argument =
-      checking.argument(checking.program.withoutParentheses(place), 0);
+  const XQueryPlaceID argument = checking.argument(checking.program.withoutParentheses(place), 0);
   return argument == XQueryNoPlace || !checking.factsOf(argument).are(AnyDecimal);
 }
 
@@ -114,22 +111,36 @@ void checkUntypedText(XQueryChecking& checking, XQueryPlaceID text, XQueryPlaceI
 
 // --- comparisons ---------------------------------------------------------------------------------
 
+// What xs:duration makes of a text is neither of the ordered durations.
+XQueryItemKinds kindsOfSide(const XQueryChecking& checking, XQueryPlaceID side) {
+  const XQueryItemKinds kinds = checking.atomicKinds(side);
+  const auto* call = checking.inside<XQueryFunctionCall>(side);
+  if (!call || !call->builtIn() || kinds != Duration) return kinds;
+  const auto& row = call->builtIn()->row();
+  const XQueryPlaceID operand = checking.argument(checking.program.withoutParentheses(side), 0);
+  const bool isPlain = row.namespaceID == XQueryNamespaceXS && row.localName == "duration" &&
+                       operand != XQueryNoPlace &&
+                       checking.factsOf(operand).are(String | Untyped | Node);
+  return isPlain ? PlainDuration : kinds;
+}
+
 void checkComparison(XQueryChecking& checking, XQueryPlaceID place, const Sides& sides) {
   if (sides.isGeneral) {
     checkUntypedText(checking, sides.left, sides.right);
     checkUntypedText(checking, sides.right, sides.left);
   }
   checkNaN(checking, place, sides);
-  const XQueryItemKinds left = checking.atomicKinds(sides.left);
-  const XQueryItemKinds right = checking.atomicKinds(sides.right);
+  const XQueryItemKinds left = kindsOfSide(checking, sides.left);
+  const XQueryItemKinds right = kindsOfSide(checking, sides.right);
   if (left == None || right == None) return;
-  const bool isPossible = anyPair(
-      left, right, [&](auto a, auto b) { return canBeCompared(a, b, sides); });
+  const bool isPossible =
+      anyPair(left, right, [&](auto a, auto b) { return canBeCompared(a, b, sides); });
   if (!isPossible) return warnOfFailure(checking, place, sides, left, right);
   const bool areInstants = ((left | right) & ~instants) == 0;
   if (areInstants && (left & right) == 0) {
-    checking.warn(place, ID::DateAndTime, {XQueryLabelOf(*checking.at(place).expr),
-                                           XQueryNameOfKinds(left), XQueryNameOfKinds(right)});
+    checking.warn(place, ID::DateAndTime,
+                  {XQueryLabelOf(*checking.at(place).expr), XQueryNameOfKinds(left),
+                   XQueryNameOfKinds(right)});
   }
 }
 
@@ -205,8 +216,7 @@ bool mayWellBeEmpty(const XQueryChecking& checking, XQueryPlaceID place) {
 
 }  // namespace
 
-void XQueryCheckEmptyComparisons(XQueryChecking& checking) {
-  const XQueryUses uses(checking);
+void XQueryCheckEmptyComparisons(XQueryChecking& checking, const XQueryUses& uses) {
   WorkPacer pacer;
   for (XQueryPlaceID place = 0; place < checking.program.placeCount(); ++place) {
     pacer.turn();

@@ -53,8 +53,7 @@ bool isCondition(const XQueryChecking& checking, XQueryPlaceID place) {
       return whole && XQueryOperatorExpr::operatorClassification(whole->operatorType()) == 1;
     }
     case XQueryRole::Argument: {
-      const std::string_view name =
-          checking.functionCalledIn(checking.at(at.parent).parent);
+      const std::string_view name = checking.functionCalledIn(checking.at(at.parent).parent);
       return name == "not" || name == "boolean";
     }
     default:
@@ -65,7 +64,8 @@ bool isCondition(const XQueryChecking& checking, XQueryPlaceID place) {
 const char* consequenceOf(const XQueryPlace& at, bool truth) {
   switch (at.role) {
     case XQueryRole::Test:
-      return truth ? "the part behind else is never reached" : "the part behind then is never reached";
+      return truth ? "the part behind else is never reached"
+                   : "the part behind then is never reached";
     case XQueryRole::Where:
       return truth ? "where is of no use" : "nothing is ever returned";
     case XQueryRole::Predicate:
@@ -83,14 +83,15 @@ void warnOfConstant(XQueryChecking& checking, XQueryPlaceID place) {
   if (at.role == XQueryRole::Predicate && checking.factsOf(place).mayBe(Numeric)) return;
   const auto truth = truthOf(checking, place);
   if (!truth) return;
-  checking.warn(place, ID::ConstantCondition, {*truth ? "true" : "false", consequenceOf(at, *truth)});
+  checking.warn(place, ID::ConstantCondition,
+                {*truth ? "true" : "false", consequenceOf(at, *truth)});
 }
 
 void warnOfKinds(XQueryChecking& checking, XQueryPlaceID place) {
   const XQueryFacts& facts = checking.factsOf(place);
   if (facts.most == 0 || checking.literalIn(place)) return;
-  constexpr XQueryItemKinds withoutTruth = DateTime | Date | Time | Duration | Gregorian | QName |
-                                           HexBinary | Base64Binary | Notation;
+  constexpr XQueryItemKinds withoutTruth =
+      DateTime | Date | Time | Duration | Gregorian | QName | HexBinary | Base64Binary | Notation;
   if (facts.are(Atomic) && facts.most > 1) {
     checking.warn(place, ID::TruthOfSeveral);
   } else if (facts.are(URI)) {

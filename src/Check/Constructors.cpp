@@ -6,6 +6,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryProlog.h"
 
+#include <algorithm>
 #include <vector>
 
 namespace xquery {

@@ -1,15 +1,22 @@
-// The types that functions and global variables declare. Nobody looks at them here, where XQuery 1.0
-// converts a value to its type or refuses it; told is what surely is converted or refused there.
+// The types that functions and global variables declare. Nobody looks at them here, where
+// XQuery 1.0 converts a value to its type or refuses it; told is what surely is converted or
+// refused there.
 #include "Check/Checking.h"
 #include "Check/Uses.h"
+#include "Expr/Paths/XQueryPath.h"
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryLeaves.h"
 #include "Functions/XQueryFunctionCall.h"
-#include "Expr/Paths/XQueryPath.h"
 #include "Plan/Labels.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
+
+#include <algorithm>
+#include <array>
+#include <string>
+#include <string_view>
+#include <vector>
 
 namespace xquery {
 namespace {
@@ -75,9 +82,23 @@ std::string nameOfValue(const XQueryFacts& value) {
   return XQueryNameOfKinds(value.kinds);
 }
 
+// Functions to which a node is the text in it.
+constexpr auto converting = std::to_array<std::string_view>({"string",          "data",
+                                                             "number",          "count",
+                                                             "exists",          "empty",
+                                                             "string-length",   "upper-case",
+                                                             "lower-case",      "contains",
+                                                             "starts-with",     "ends-with",
+                                                             "substring",       "substring-before",
+                                                             "substring-after", "normalize-space",
+                                                             "translate",       "concat",
+                                                             "string-join",     "matches",
+                                                             "replace",         "tokenize"});
+
 class Declarations {
  public:
-  explicit Declarations(XQueryChecking& checking) : _checking(checking), _uses(checking) {}
+  Declarations(XQueryChecking& checking, const XQueryUses& uses)
+      : _checking(checking), _uses(uses) {}
 
   void run() {
     for (const XQueryProgramBody& body : _checking.program.bodies()) {
@@ -94,16 +115,40 @@ class Declarations {
   }
 
  private:
-  void judge(XQueryPlaceID place, const std::string& what, const XQueryTypeDeclaration* type) {
+  void judge(XQueryPlaceID place, const std::string& what, const XQueryTypeDeclaration* type,
+             const XQueryProlog& prolog, const std::vector<XQueryPlaceID>& readers) {
     const XQueryFacts& value = _checking.factsOf(place);
-    const Fit fit = fitOf(*_checking.program.bodyOf(place).prolog, type, value);
+    const Fit fit = fitOf(prolog, type, value);
     if (fit == Fit::Fits) return;
+    if (fit == Fit::Converted && areConverting(readers)) return;
     const std::string label = XQueryLabelOf(*type);
     if (fit == Fit::Converted) {
       _checking.warn(place, ID::NotConverted, {what, label, nameOfValue(value)});
     } else {
-      _checking.warn(place, ID::NotChecked, {what, label, "not " + nameOfValue(value)});
+      _checking.warn(place, ID::NotChecked, {what, label, nameOfValue(value)});
     }
+  }
+
+  // Whether whoever reads the value takes the text or the number in it by himself.
+  bool areConverting(const std::vector<XQueryPlaceID>& readers) const {
+    const auto converts = [&](XQueryPlaceID reader) {
+      const XQueryPlace& at = _checking.at(reader);
+      if (at.role == XQueryRole::Operand) {
+        const Kind kind = _checking.at(at.parent).expr->kind();
+        return kind == Kind::CastExpr || kind == Kind::CastableExpr;
+      }
+      if (at.role != XQueryRole::Argument) return false;
+      const XQueryPlaceID whole = _checking.at(at.parent).parent;
+      const auto* call = _checking.as<XQueryFunctionCall>(whole);
+      if (!call || !call->builtIn()) return false;
+      const auto space = call->builtIn()->row().namespaceID;
+      if (space == XQueryNamespaceXS || space == XQueryNamespaceXDT) return true;
+      const std::string_view name = _checking.functionCalledIn(whole);
+      return std::find(converting.begin(), converting.end(), name) != converting.end();
+    };
+    constexpr size_t mostReaders = 200;  // of more than that nothing is said
+    if (readers.size() > mostReaders) return true;
+    return !readers.empty() && std::all_of(readers.begin(), readers.end(), converts);
   }
 
   void lookAtCall(XQueryPlaceID place, const XQueryFunctionCall& call) {
@@ -114,8 +159,11 @@ class Declarations {
     for (XQueryPlaceID each = _checking.program.firstPart(list);
          each != XQueryNoPlace && index < params.size();
          each = _checking.program.nextPart(each), ++index) {
+      static const std::vector<XQueryPlaceID> none;
+      const auto* body = _checking.bodyOf(call.functionDecl());
       judge(each, "argument " + std::to_string(index + 1) + " of " + call.name()->utf8(),
-            params[index]->type());
+            params[index]->type(), call.functionDecl()->prolog(),
+            body ? _uses.readsOf(body->place, params[index]->varID()) : none);
     }
   }
 
@@ -132,7 +180,8 @@ class Declarations {
     for (const auto& param : function.params()) {
       lookAtType(body, param->type(), param->exprLine());
     }
-    judge(body.place, "the result of " + nameOf(function), function.type());
+    judge(body.place, "the result of " + nameOf(function), function.type(), *body.prolog,
+          _uses.callsOf(&function));
     const XQueryPlaceID end = _checking.at(body.place).end;
     WorkPacer pacer;
     for (XQueryPlaceID place = body.place; place < end; ++place) {
@@ -162,7 +211,8 @@ class Declarations {
     const XQueryVarDecl& variable = *body.variable;
     if (!body.expr || !variable.writtenName()) return;
     lookAtType(body, variable.type(), variable.line());
-    judge(body.place, "variable $" + variable.writtenName()->utf8(), variable.type());
+    judge(body.place, "variable $" + variable.writtenName()->utf8(), variable.type(), *body.prolog,
+          _uses.readsOf(&variable));
   }
 
   // What a declaration names is part of no expression.
@@ -190,13 +240,13 @@ class Declarations {
   }
 
   XQueryChecking& _checking;
-  const XQueryUses _uses;
+  const XQueryUses& _uses;
 };
 
 }  // namespace
 
-void XQueryCheckDeclarations(XQueryChecking& checking) {
-  Declarations(checking).run();
+void XQueryCheckDeclarations(XQueryChecking& checking, const XQueryUses& uses) {
+  Declarations(checking, uses).run();
 }
 
 }  // namespace xquery

@@ -8,7 +8,6 @@
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryLeaves.h"
 #include "Functions/XQueryFunctionCall.h"
-#include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
 
@@ -65,24 +64,24 @@ bool warnOfAbsent(XQueryChecking& checking, XQueryPlaceID place, const XQueryFun
 
 // "1", "2 or 3", "2 or more": how many arguments the declared functions of a name take; empty where
 // there is none of that name.
-std::string declaredCounts(const XQueryProlog& prolog, const XQueryQName& name) {
+std::string declaredCounts(XQueryChecking& checking, const XQueryProlog& prolog,
+                           const XQueryQName& name) {
   std::vector<size_t> counts;
-  WorkPacer pacer;
-  for (const Value& declaration : prolog.declarations()) {
-    pacer.turn();
-    const auto* function = dyn_cast<XQueryFunctionDecl>(declaration);
-    if (function && function->name()->isEqual(name)) counts.push_back(function->params().size());
+  for (const auto* function : checking.functionsNamed(prolog, name.localPart()->utf8())) {
+    if (function->name()->isEqual(name)) counts.push_back(function->params().size());
   }
   std::sort(counts.begin(), counts.end());
   std::string text;
   for (const size_t count : counts) text += (text.empty() ? "" : " or ") + std::to_string(count);
-  return text;
+  return text.empty() ? text : text + (text == "1" ? " argument" : " arguments");
 }
 
 std::string countsOf(const XQueryBuiltInFunction::Arguments& arguments) {
   const std::string least = std::to_string(arguments.least);
-  if (arguments.most == XQueryBuiltInFunction::many) return least + " or more";
-  return arguments.most == arguments.least ? least : least + " to " + std::to_string(arguments.most);
+  if (arguments.most == XQueryBuiltInFunction::many) return least + " or more arguments";
+  if (arguments.most == 1 && arguments.least == 1) return "1 argument";
+  const std::string most = std::to_string(arguments.most);
+  return (arguments.most == arguments.least ? least : least + " to " + most) + " arguments";
 }
 
 }  // namespace
@@ -105,13 +104,15 @@ void XQueryCheckCallName(XQueryChecking& checking, XQueryPlaceID place) {
       checking.warn(place, ID::FunctionsNamespace, {name}, call.name());
       return;
     }
-    const std::string counts = declaredCounts(prolog, *qName);
+    const std::string counts = declaredCounts(checking, prolog, *qName);
     if (!counts.empty()) {
       checking.warn(place, ID::ArgumentCount, {name, counts, std::to_string(count)}, call.name());
       return;
     }
   }
-  checking.warn(place, ID::UnknownFunction, {name, std::to_string(count)}, call.name());
+  checking.warn(place, ID::UnknownFunction,
+                {name, std::to_string(count) + (count == 1 ? " argument" : " arguments")},
+                call.name());
 }
 
 // --- variables -----------------------------------------------------------------------------------

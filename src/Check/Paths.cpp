@@ -1,9 +1,8 @@
 // Steps that find nothing, steps from what is no node, and paths that XQuery 1.0 answers otherwise.
-#include "Expr/Paths/XQueryPath.h"
-
 #include "Check/Checking.h"
 #include "Check/Uses.h"
 #include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Labels.h"
 #include "Platform/Base/WorkMeter.h"
@@ -100,9 +99,9 @@ class Steps {
     if (from == None) return false;
     const Axis& axis = axisOf(step);
     if ((from & axis.from) == 0) {
-      _checking.warn(place, ID::StepNeverMatches,
-                     {labelOf(step),
-                      XQueryNameOfKinds(from) + " has no " + std::string(axis.missing)});
+      _checking.warn(
+          place, ID::StepNeverMatches,
+          {labelOf(step), XQueryNameOfKinds(from) + " has no " + std::string(axis.missing)});
       return false;
     }
     if (step.axis() == XQueryAxisSelf && (from & ~Attribute) == 0 && isNameTest(step.expr())) {
@@ -197,8 +196,7 @@ const XQueryAxisStep* lastReverseStep(const XQueryPathExpr& path) {
 
 }  // namespace
 
-void XQueryCheckReverseOrder(XQueryChecking& checking) {
-  const XQueryUses uses(checking);
+void XQueryCheckReverseOrder(XQueryChecking& checking, const XQueryUses& uses) {
   WorkPacer pacer;
   for (XQueryPlaceID place = 0; place < checking.program.placeCount(); ++place) {
     pacer.turn();

@@ -1,9 +1,8 @@
 // What the parser noted of each module, and the imports.
-#include "Prolog/XQueryRemark.h"
-
 #include "Check/Checking.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
+#include "Prolog/XQueryRemark.h"
 
 #include <string>
 #include <unordered_set>
@@ -66,13 +65,12 @@ void tell(XQueryChecking& checking, const XQueryProlog& module, const XQueryRema
 
 // A module that has another namespace than its import names is imported all the same.
 void checkImports(XQueryChecking& checking, const XQueryProlog& module) {
+  std::unordered_set<std::string> namespaces;
+  for (const XQueryProlog* imported : module.importedModules()) {
+    namespaces.insert(textOf(imported->namespaceForPrefix(imported->modulePrefix()->view())));
+  }
   for (const auto& import : module.moduleImports()) {
-    bool isThere = false;
-    for (const XQueryProlog* imported : module.importedModules()) {
-      const auto URI = imported->namespaceForPrefix(imported->modulePrefix()->view());
-      isThere = isThere || (URI && URI->isEqualToString(*import->namespaceString()));
-    }
-    if (isThere) continue;
+    if (namespaces.contains(textOf(import->namespaceString()))) continue;
     checking.warnAt(module, import->line(), ID::ModuleNamespace,
                     {textOf(import->namespaceString())});
   }
@@ -80,7 +78,7 @@ void checkImports(XQueryChecking& checking, const XQueryProlog& module) {
 
 }  // namespace
 
-void XQueryCheckRemarks(XQueryChecking& checking) {
+void XQueryCheckRemarks(XQueryChecking& checking, const XQueryUses&) {
   std::unordered_set<const XQueryProlog*> seen{&checking.main};
   std::vector<const XQueryProlog*> waiting{&checking.main};
   while (!waiting.empty()) {

@@ -1,5 +1,5 @@
-// Sequence types where they are looked at: "instance of", "treat as", "typeswitch", and the variables
-// of for, let and quantifiers.
+// Sequence types where they are looked at: "instance of", "treat as", "typeswitch", and the
+// variables of for, let and quantifiers.
 #include "Check/Checking.h"
 #include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"

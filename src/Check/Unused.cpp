@@ -1,7 +1,8 @@
 // Variables that nobody reads and functions that nobody calls.
 //
-// The variable of a for clause and a parameter are left alone: going round is a use, and a parameter
-// belongs to those who call. So is a name that begins with "_", and what is traced on the way.
+// The variable of a for clause and a parameter are left alone: going round is a use, and a
+// parameter belongs to those who call. So is a name that begins with "_", and what is traced on the
+// way.
 #include "Check/Checking.h"
 #include "Check/Uses.h"
 #include "Expr/Clauses/XQueryFLWOR.h"
@@ -11,7 +12,9 @@
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
 
+#include <string>
 #include <unordered_set>
+#include <vector>
 
 namespace xquery {
 namespace {
@@ -20,13 +23,15 @@ using ID = XQueryWarningID;
 
 class Unused {
  public:
-  explicit Unused(XQueryChecking& checking) : _checking(checking), _uses(checking) {}
+  Unused(XQueryChecking& checking, const XQueryUses& uses) : _checking(checking), _uses(uses) {}
 
   void run() {
     WorkPacer pacer;
     for (XQueryPlaceID place = 0; place < _checking.program.placeCount(); ++place) {
       pacer.turn();
       if (const auto* clause = _checking.as<XQueryBindingExpr>(place)) lookAtClause(place, *clause);
+      const auto* call = _checking.as<XQueryFunctionCall>(place);
+      if (call && !call->builtIn() && !call->functionDecl()) _missed.insert(call->name()->utf8());
     }
     lookAtGlobals();
     // A library module is there for others to call.
@@ -44,9 +49,17 @@ class Unused {
   void lookAtClause(XQueryPlaceID place, const XQueryBindingExpr& clause) {
     if (const auto* forExpr = dyn_cast<XQueryForExpr>(&clause)) {
       lookAtVariable(place, forExpr->posVarName(), forExpr->posVarID());
-    } else if (!_checking.factsOf(place).does(XQueryDeeds::Traces)) {
+    } else if (!_checking.factsOf(place).does(XQueryDeeds::Traces) && !asksForItemsOnly(place)) {
       lookAtVariable(place, clause.varName(), clause.varID());
     }
+  }
+
+  // "some $x in ... satisfies true()" asks whether there is anything.
+  bool asksForItemsOnly(XQueryPlaceID clause) const {
+    if (_checking.at(clause).expr->kind() != Kind::QuantifiedItem) return false;
+    const XQueryPlaceID whole = _checking.at(clause).parent;
+    const XQueryPlaceID condition = _checking.program.part(whole, XQueryRole::Satisfies);
+    return condition != XQueryNoPlace && _checking.functionCalledIn(condition) == "true";
   }
 
   void lookAtVariable(XQueryPlaceID place, const Ref<NSString>& name, int64_t varID) {
@@ -101,18 +114,22 @@ class Unused {
       if (!function || &function->prolog() != &_checking.main || function->isExternal()) continue;
       const Ref<NSString>& name = function->writtenName();
       if (!name || isMeant(name) || reached.contains(function)) continue;
+      if (_missed.contains(name->utf8())) continue;
       _checking.warnAt(_checking.main, function->line(), ID::UnusedFunction, {name->utf8()}, name);
     }
   }
 
   XQueryChecking& _checking;
-  const XQueryUses _uses;
+  const XQueryUses& _uses;
+  // Calls that lead nowhere, mostly for a wrong number of arguments: their functions count as
+  // called.
+  std::unordered_set<std::string> _missed;
 };
 
 }  // namespace
 
-void XQueryCheckUnused(XQueryChecking& checking) {
-  Unused(checking).run();
+void XQueryCheckUnused(XQueryChecking& checking, const XQueryUses& uses) {
+  Unused(checking, uses).run();
 }
 
 }  // namespace xquery

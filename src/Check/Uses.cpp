@@ -35,6 +35,14 @@ constexpr auto showingOrder = std::to_array<std::string_view>(
     {"reverse", "subsequence", "insert-before", "remove", "index-of", "string-join", "data",
      "trace", "one-or-more", "zero-or-one", "exactly-one", "deep-equal"});
 
+// How many places a question follows a value to.
+constexpr size_t mostPlaces = 200;
+
+void handOn(const std::vector<XQueryPlaceID>& to, std::vector<XQueryPlaceID>& next) {
+  const size_t count = std::min(to.size(), mostPlaces + 1);
+  next.insert(next.end(), to.begin(), to.begin() + static_cast<ptrdiff_t>(count));
+}
+
 }  // namespace
 
 XQueryUses::XQueryUses(const XQueryChecking& checking)
@@ -87,7 +95,6 @@ bool XQueryUses::showsOrder(XQueryPlaceID place) const {
 }
 
 bool XQueryUses::isHidden(XQueryPlaceID place, Question question) const {
-  constexpr size_t mostPlaces = 200;
   std::vector<XQueryPlaceID> places{place};
   for (size_t index = 0; index < places.size(); ++index) {
     std::vector<XQueryPlaceID> next;
@@ -162,7 +169,7 @@ XQueryUses::Taken XQueryUses::takenByCall(XQueryPlaceID place, Question question
     const auto* body = _checking.bodyOf(function);
     if (!body || index >= function->params().size()) return Taken::Hidden;
     const auto& reads = readsOf(body->place, function->params()[index]->varID());
-    next.insert(next.end(), reads.begin(), reads.end());
+    handOn(reads, next);
     return Taken::HandedOn;
   }
   const std::string_view name = _checking.functionCalledIn(whole);
@@ -179,7 +186,7 @@ XQueryUses::Taken XQueryUses::takenByBody(XQueryPlaceID place,
   const XQueryProgramBody& body = _program.bodyOf(place);
   if (!body.function && !body.variable) return Taken::Shown;
   const auto& users = body.function ? callsOf(body.function) : readsOf(body.variable);
-  next.insert(next.end(), users.begin(), users.end());
+  handOn(users, next);
   return Taken::HandedOn;
 }
 
@@ -187,16 +194,18 @@ XQueryUses::Taken XQueryUses::takenByClause(XQueryPlaceID place, Question questi
                                             std::vector<XQueryPlaceID>& next) const {
   const XQueryPlaceID whole = _program[place].parent;
   if (_program[place].role == XQueryRole::Return) {
-    if (question == Question::Truth) return Taken::Shown;
+    const bool isOne = _checking.factsOf(whole).most <= 1;
+    if (question == Question::Truth && !isOne) return Taken::Shown;
     const auto* flwor = _checking.as<XQueryFLWORExpr>(whole);
-    if (flwor && !flwor->orderSpecs().empty()) return Taken::Hidden;
+    const bool isSorted = flwor && !flwor->orderSpecs().empty();
+    if (isSorted && question == Question::Order) return Taken::Hidden;
     next.push_back(whole);
     return Taken::HandedOn;
   }
   const auto* clause = _checking.as<XQueryBindingExpr>(whole);
   if (clause && clause->kind() == Kind::LetExpr) {
     const auto& reads = readsOf(whole, clause->varID());
-    next.insert(next.end(), reads.begin(), reads.end());
+    handOn(reads, next);
     return Taken::HandedOn;
   }
   if (question == Question::Truth) return Taken::Shown;
