@@ -1,9 +1,12 @@
 // Built-in functions that answer otherwise than in XQuery 1.0 for the arguments that they are
 // given.
 #include "Check/Checking.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLeaves.h"
 #include "Functions/XQueryFunctionCall.h"
+#include "Functions/XQueryRegEx.h"
+#include "Types/XQueryAtomization.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Number.h"
 
@@ -44,7 +47,11 @@ void lookAtDeepEqual(XQueryChecking& checking, XQueryPlaceID call, std::string_v
   const auto holdsElements = [](const XQueryFacts& facts) {
     return facts.most > 0 && facts.are(Node) && facts.mayBe(Element | Document);
   };
-  if (holdsElements(first) && holdsElements(second)) checking.warn(call, ID::DeepEqual);
+  if (!holdsElements(first) || !holdsElements(second)) return;
+  // With "and" behind or before it the attributes may be compared as well.
+  const XQueryPlaceID whole = checking.at(call).parent;
+  const auto* expr = checking.as<XQueryOperatorExpr>(whole);
+  if (!expr || expr->operatorType() != XQueryOperatorAnd) checking.warn(call, ID::DeepEqual);
 }
 
 void lookAtIndexOf(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
@@ -85,6 +92,14 @@ void lookAtBaseURI(XQueryChecking& checking, XQueryPlaceID call, std::string_vie
 }
 
 void lookAtNumber(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  if (const XQueryPlaceID items = checking.argument(call, 0); items != XQueryNoPlace) {
+    const XQueryFacts& facts = checking.factsOf(items);
+    if (facts.most > 0 && facts.least > 1) {
+      checking.warn(call, ID::CallDiffers, {"number of several items", "it is NaN"});
+    } else if (facts.most > 0 && facts.are(URI)) {
+      checking.warn(call, ID::CallDiffers, {"number of a URI", "it fails, use string()"});
+    }
+  }
   const auto* text = checking.textIn(checking.argument(call, 0));
   if (!text) return;
   // Numbers begin with a sign, a digit or a point; what does not is NaN in both languages.
@@ -98,6 +113,30 @@ void lookAtNumber(XQueryChecking& checking, XQueryPlaceID call, std::string_view
   const size_t end = rest.find_first_not_of("0123456789+-.eE \t\r\n");
   if (!begins || end == rest.npos) return;
   checking.warn(call, ID::NumberFromFront, {checking.labelOf(checking.argument(call, 0))});
+}
+
+void lookAtNodeName(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  if (checking.argumentCount(call) > 0) return;
+  checking.warn(call, ID::CallDiffers, {"node-name without an argument", "it gives nothing"});
+}
+
+void lookAtError(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const XQueryPlaceID code = checking.argument(call, 0);
+  if (code == XQueryNoPlace) return;
+  const XQueryFacts& facts = checking.factsOf(code);
+  if (facts.most == 0 || facts.mayBe(QName | Other)) return;
+  checking.warn(call, ID::CallDiffers, {"error of what is no QName", "its code is lost"});
+}
+
+// Of what is known to hold both, and of no item that may be anything.
+void lookAtDistinct(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
+  const XQueryFacts& facts = checking.factsOf(checking.argument(call, 0));
+  if (facts.most == 0 || facts.mayBe(Other)) return;
+  if (!facts.are(Boolean | Numeric | String) || !facts.mayBe(Boolean) || !facts.mayBe(Numeric)) {
+    return;
+  }
+  checking.warn(call, ID::CallDiffers,
+                {std::string(name) + " of truth values and numbers", "true equals 1, false 0"});
 }
 
 void lookAtNormalForm(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
@@ -133,10 +172,34 @@ std::string otherConstructIn(std::string_view pattern) {
   return {};
 }
 
-void lookAtPattern(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+// Asks the engine itself. Compiling takes stack for each group, of which most patterns have few.
+void checkPattern(XQueryChecking& checking, XQueryPlaceID call, std::string_view name,
+                  const NSString& pattern) {
+  constexpr uint32_t mostUnits = 500;
+  if (pattern.length() > mostUnits) return;
+  const std::string text = pattern.utf8();
+  if (std::count(text.begin(), text.end(), '(') > 20) return;
+  const size_t flagsIndex = name == "replace" ? 3 : 2;
+  const bool hasFlags = checking.argumentCount(call) > flagsIndex;
+  const auto* flags = checking.textIn(checking.argument(call, flagsIndex));
+  if (hasFlags && !flags) return;
+  const auto regEx = XQueryRegEx::regExp(pattern.view(), flags ? flags->view() : NSStringView());
+  const std::string label = checking.labelOf(checking.argument(call, 1));
+  if (!regEx) {
+    checking.warn(call, ID::PatternFails, {label, "it or its flags are not well formed"});
+  } else if (name != "matches" && XQueryIsTrue(regEx->hasMatch(NSString::empty().get()))) {
+    checking.warn(call, ID::PatternFails,
+                  {label, name == "replace" ? "replace fails where it matches no text"
+                                            : "tokenize fails where it matches no text"});
+  }
+}
+
+void lookAtPattern(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
   const auto* text = checking.textIn(checking.argument(call, 1));
-  const std::string construct = text ? otherConstructIn(text->utf8()) : std::string();
-  if (!construct.empty()) checking.warn(call, ID::PatternDiffers, {construct});
+  if (!text) return;
+  const std::string construct = otherConstructIn(text->utf8());
+  if (construct.empty()) return checkPattern(checking, call, name, *text);
+  checking.warn(call, ID::PatternDiffers, {construct});
 }
 
 // A step behind an axis step is asked for each node by itself.
@@ -205,6 +268,9 @@ constexpr auto rows = std::to_array<Row>({
     {"avg", lookAtExtreme},
     {"base-uri", lookAtBaseURI},
     {"number", lookAtNumber},
+    {"node-name", lookAtNodeName},
+    {"error", lookAtError},
+    {"distinct-values", lookAtDistinct},
     {"normalize-unicode", lookAtNormalForm},
     {"matches", lookAtPattern},
     {"replace", lookAtPattern},

@@ -75,8 +75,7 @@ void checkType(XQueryChecking& checking, XQueryPlaceID place, const XQueryTypeDe
                const XQueryFacts& value, XQueryPlaceID operand) {
   if (warnOfOperand(checking, place, type, operand)) return;
   if (!isPossible(type, value)) {
-    // "+" alone keeps one item out.
-    checking.warn(place, ID::UnreachableCase, {XQueryLabelOf(type)});
+    checking.warn(place, ID::ImpossibleType, {XQueryLabelOf(type)});
     return;
   }
   const bool isPlus = type.occuranceType() == XQueryTypeDeclaration::OneOrMore;

@@ -35,8 +35,8 @@ constexpr auto rows = std::to_array<XQueryWarningRow>({
     {ID::UnusedFunction, "unused-function", "function … is never called", "of no use"},
     {ID::ConstantCondition, "constant-condition", "the condition is always …: …",
      "part of the query is never evaluated, or the condition of no use"},
-    {ID::UnreachableCase, "unreachable-case", "no value here is of the type …",
-     "the case is never taken"},
+    {ID::ImpossibleType, "impossible-type", "no value here is of the type …",
+     "the test is false, the case never taken, the rest fails"},
     {ID::StepNeverMatches, "step-never-matches", "step … finds nothing: …", "always empty"},
     {ID::StepFromValue, "step-from-value", "step … begins at …, which is no node",
      "fails when it is reached"},
@@ -170,6 +170,8 @@ constexpr auto rows = std::to_array<XQueryWarningRow>({
      "XQuery 1.0 takes them in any case"},
     {ID::PatternDiffers, "pattern-differs", "… in a pattern means something else here",
      "patterns are those of Perl"},
+    {ID::PatternFails, "pattern-fails", "pattern …: …", "fails when it is reached"},
+    {ID::CallDiffers, "call-differs", "…: …", "XQuery 1.0 answers something else"},
 });
 
 constexpr bool isInOrder() {

@@ -25,7 +25,7 @@ enum class XQueryWarningID : uint8_t {
   UnusedVariable,
   UnusedFunction,
   ConstantCondition,
-  UnreachableCase,
+  ImpossibleType,
   StepNeverMatches,
   StepFromValue,
   // Operators.
@@ -96,6 +96,8 @@ enum class XQueryWarningID : uint8_t {
   BaseURIOfDocument,
   NormalForm,
   PatternDiffers,
+  PatternFails,
+  CallDiffers,
   Count,
 };
 
