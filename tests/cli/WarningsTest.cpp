@@ -79,7 +79,7 @@ TEST(Warnings, OfAPrefixThatTheCommandLineDeclaresThereAreNone) {
 
 TEST(Warnings, OfAStreamAreThoseOfTheQuery) {
   const Outcome outcome =
-      xquery({"--check", "--stream", "-e", "for $a at $i in /r/a return string($a)", "-"});
+      xquery({"--check", "--stream", "-e", "for $a in /r/a let $b := 1 return string($a)", "-"});
   EXPECT_EQ(outcome.status, 0);
   EXPECT_THAT(outcome.err, HasSubstr("[unused-variable]"));
   EXPECT_EQ(xquery({"--check", "--stream", "-e", "//a/..", "-"}).status, 1);
