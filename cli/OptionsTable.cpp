@@ -241,7 +241,7 @@ constexpr OptionRow rows[] = {
     {ofReports, "--quiet", Takes::Nothing, "", Offers::Nothing,
      "Show neither the progress of reading nor warnings", set<&Options::quiet>},
     {ofReports, "--progress", Takes::Nothing, "", Offers::Nothing,
-     "Show that line for each of several inputs too", set<&Options::progress>},
+     "Show the progress of each of several inputs too", set<&Options::progress>},
 };
 
 }  // namespace
