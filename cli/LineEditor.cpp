@@ -16,6 +16,7 @@
 #include <string_view>
 #include <sys/ioctl.h>
 #include <unistd.h>
+#include <utility>
 
 namespace cli {
 namespace {
@@ -55,7 +56,12 @@ size_t bytesBehind(unsigned char first) {
   return first >= 0xF0 && first < 0xF5 ? 3 : 0;
 }
 
-// Reads one character of bytes that `next` gives, which answers -1 when there are no more.
+bool continuesCharacter(unsigned char byte) {
+  return (byte & 0xC0) == 0x80;
+}
+
+// Reads one character of bytes that `next` gives, which answers -1, and takes nothing, where none
+// follows that continues a character.
 template <class Next>
 wchar_t decode(unsigned char first, const Next& next) {
   if (first < 0x80) return first;
@@ -64,7 +70,7 @@ wchar_t decode(unsigned char first, const Next& next) {
   unsigned code = first & (0x3FU >> count);
   for (size_t n = 0; n < count; ++n) {
     const int byte = next();
-    if (byte < 0 || (byte & 0xC0) != 0x80) return replacement;
+    if (byte < 0) return replacement;
     code = code << 6 | (static_cast<unsigned>(byte) & 0x3F);
   }
   return code > 0x10FFFF || (code >= 0xD800 && code < 0xE000) ? replacement
@@ -76,7 +82,9 @@ std::wstring widen(std::string_view text) {
   for (size_t at = 0; at < text.size();) {
     const auto first = static_cast<unsigned char>(text[at++]);
     result += decode(first, [&]() -> int {
-      return at < text.size() ? static_cast<unsigned char>(text[at++]) : -1;
+      const bool goesOn =
+          at < text.size() && continuesCharacter(static_cast<unsigned char>(text[at]));
+      return goesOn ? static_cast<unsigned char>(text[at++]) : -1;
     });
   }
   return result;
@@ -232,6 +240,7 @@ class LineEditor::Implementation {
 
   // -1 when there is none, for the reason that is the event then.
   int nextByte() {
+    if (_notTaken >= 0) return std::exchange(_notTaken, -1);
     for (;;) {
       pollfd ready[] = {{STDIN_FILENO, POLLIN, 0}, {_signals->descriptor(), POLLIN, 0}};
       if (poll(ready, 2, -1) < 0 && errno != EINTR) return -1;
@@ -253,7 +262,12 @@ class LineEditor::Implementation {
   int nextCharacter(wchar_t& character) {
     const int first = nextByte();
     if (first < 0) return _event == Event::Interrupt ? -1 : 0;
-    character = decode(static_cast<unsigned char>(first), [this] { return nextByte(); });
+    character = decode(static_cast<unsigned char>(first), [this] {
+      const int byte = nextByte();
+      if (byte >= 0 && continuesCharacter(static_cast<unsigned char>(byte))) return byte;
+      _notTaken = byte;
+      return -1;
+    });
     return 1;
   }
 
@@ -299,6 +313,7 @@ class LineEditor::Implementation {
   const TerminalSignals* _signals = nullptr;
   std::wstring _prompt;
   Event _event = Event::End;
+  int _notTaken = -1;  // a byte that was read, and is the next one all the same
 };
 
 LineEditor::LineEditor(Completer complete)

@@ -275,6 +275,7 @@ TEST_F(Session, ReadsUTF8WhateverTheLocale) {
     EXPECT_EQ(session->ask("string-length('äß日')"), "3\n") << locale;
     EXPECT_EQ(session->ask("'ä'"), "ä\n") << locale;
     EXPECT_EQ(session->ask("string-length('\xFF')"), "1\n") << locale;
+    EXPECT_EQ(session->ask("string-length('\xE6\x97')"), "1\n") << locale;
   }
 }
 
