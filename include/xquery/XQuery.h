@@ -47,6 +47,7 @@ enum class XQueryWay : uint8_t {
   Explained,  // planned whatever the environment says; plan and warnings can be looked at
   Streamed,   // planned, to be evaluated record by record; where that cannot be done the query has
               // the compile error 0 "cannot be evaluated as a stream: " and the reason
+  Profiled,   // as Planned, and each evaluation counts and times its expressions: see Profile.h
 };
 
 enum class XQueryPlanFormat : uint8_t {

@@ -10,6 +10,7 @@
 #include "xquery/Memory.h"
 #include "xquery/Number.h"
 #include "xquery/Object.h"
+#include "xquery/Profile.h"
 #include "xquery/Serializing.h"
 #include "xquery/Stream.h"
 #include "xquery/String.h"

@@ -1,5 +1,6 @@
 #include "Context/XQueryContextInternal.h"
 
+#include "Context/ProfileRecorder.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
@@ -209,6 +210,14 @@ Ref<NSString> XQueryDefaultElementNamespace(const XQueryContext& context) {
 
 Ref<NSString> XQueryNamespaceForPrefix(const XQueryContext& context, NSStringView prefix) {
   return context._internal().namespaceForPrefix(prefix);
+}
+
+XQueryProfileRecorder& XQueryContextInternal::profileOf(
+    std::shared_ptr<const XQueryProfiledProgram> program, size_t counters) {
+  if (!_profile || _profile->program() != program) {
+    _profile = std::make_unique<XQueryProfileRecorder>(std::move(program), counters);
+  }
+  return *_profile;
 }
 
 Value XQueryContextInternal::XQueryExternalFunctionForQName(const XQueryQName&) const {

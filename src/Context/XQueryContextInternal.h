@@ -25,6 +25,8 @@
 namespace xquery {
 
 class XQueryDate;
+class XQueryProfileRecorder;
+struct XQueryProfiledProgram;
 class XQueryProlog;
 class XQueryRegExCache;
 
@@ -175,6 +177,13 @@ class XQueryContextInternal {
   // The regular expressions compiled last; null until the first one.
   std::shared_ptr<XQueryRegExCache>& regExCache() { return _regExCache; }
 
+  // What the expressions of the query cost that was compiled to be profiled and evaluated last;
+  // null when there was none.
+  XQueryProfileRecorder* profile() const { return _profile.get(); }
+  // Goes on with the profile of that program, or begins a new one.
+  XQueryProfileRecorder& profileOf(std::shared_ptr<const XQueryProfiledProgram> program,
+                                   size_t counters);
+
   const XQueryLimits& limits() const { return _limits; }
   void setLimits(XQueryLimits limits) { _limits = std::move(limits); }
 
@@ -206,6 +215,7 @@ class XQueryContextInternal {
   NSURLTable<Ref<NSURLHandle>> _URLCache;
   XQueryKeptValues _keptValues;
   XQueryBaseURIs _baseURIs;
+  std::unique_ptr<XQueryProfileRecorder> _profile;
   Ref<XQueryError> _error;
   Ref<XQueryDate> _currentDateTime;
   XQueryProlog* _prolog = nullptr;

@@ -7,6 +7,7 @@
 #include "Engine/BaseURIDecoration.h"
 #include "Engine/XQueryInternal.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Profile/XQueryProfiledProgram.h"
 #include "Plan/Report.h"
 #include "Platform/Base/HostFailure.h"
 #include "Platform/Base/LastingObjects.h"
@@ -241,6 +242,24 @@ void dropValues(XQueryContextInternal& context, const Value& formerContextItem,
   context.setContextItem(formerContextItem, formerPosition);
 }
 
+// Counts one evaluation of a query that was compiled for it, however it ends.
+class Profiling {
+ public:
+  Profiling(XQueryContextInternal& context,
+            const std::shared_ptr<const XQueryProfiledProgram>& program)
+      : _profile(program ? &context.profileOf(program, program->counted.size()) : nullptr) {
+    if (_profile) _profile->begin();
+  }
+  Profiling(const Profiling&) = delete;
+  Profiling& operator=(const Profiling&) = delete;
+  ~Profiling() {
+    if (_profile) _profile->end();
+  }
+
+ private:
+  XQueryProfileRecorder* const _profile;
+};
+
 }  // namespace
 
 Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryConstants& constants,
@@ -250,6 +269,7 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
   if (compiled.isError()) return shapedResult(query.parseErrors(), error);
 
   const NSXMLEra era;
+  const Profiling profiling(*_private, compiled.profiledProgram());
   beginEvaluation(compiled);
   if (contextItem && !isNull(contextItem)) _private->setContextItem(contextItem, 1);
   const Value result = evaluateModule(compiled, constants, [&] {

@@ -3,6 +3,7 @@
 #include "Check/Check.h"
 #include "Parser/XQueryParser.h"
 #include "Plan/Plan.h"
+#include "Plan/Profile/XQueryProfiledProgram.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryParsedModule.h"
@@ -13,7 +14,18 @@ namespace xquery {
 
 XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource, const XQueryLoading& loading,
                                XQueryWay way) {
-  const auto parser = XQueryParser::parserWithSource(initWithSource);
+  if (way == XQueryWay::Profiled) {
+    const auto start = std::chrono::steady_clock::now();
+    compile(initWithSource, loading, way);
+    completeProfiledProgram(initWithSource, std::chrono::steady_clock::now() - start);
+  } else {
+    compile(initWithSource, loading, way);
+  }
+}
+
+void XQueryInternal::compile(const Ref<NSString>& source, const XQueryLoading& loading,
+                             XQueryWay way) {
+  const auto parser = XQueryParser::parserWithSource(source);
   _errors = parser->errors();
   if (!_errors.empty()) return;
 
@@ -45,6 +57,8 @@ void XQueryInternal::plan(XQueryWay way) {
     auto report = std::make_unique<XQueryPlanReport>();
     _body = XQueryPlanned(*_prolog, _body, *report);
     _planReport = std::move(report);
+  } else if (way == XQueryWay::Profiled) {
+    planToProfile();
   } else if (way == XQueryWay::Planned && XQueryPlanIsEnabled()) {
     _body = XQueryPlanned(*_prolog, _body);
   }
@@ -54,6 +68,23 @@ void XQueryInternal::planStream() {
   Ref<XQueryError> refusal;
   _streamProgram = XQueryStreamProgram::of(*_prolog, _body, refusal);
   if (refusal) _errors.push_back(std::move(refusal));
+}
+
+void XQueryInternal::planToProfile() {
+  auto profiled = std::make_shared<XQueryProfiledProgram>();
+  const auto start = std::chrono::steady_clock::now();
+  _body = XQueryProfiled(*_prolog, _body, *profiled);
+  profiled->planning = std::chrono::steady_clock::now() - start;
+  _profiledProgram = std::move(profiled);
+}
+
+void XQueryInternal::completeProfiledProgram(const Ref<NSString>& source,
+                                             std::chrono::nanoseconds taken) {
+  if (!_profiledProgram) return;
+  auto complete = std::make_shared<XQueryProfiledProgram>(*_profiledProgram);
+  complete->source = source->utf8();
+  complete->compiling = taken;
+  _profiledProgram = std::move(complete);
 }
 
 XQueryInternal::XQueryInternal(Ref<XQueryError> error) : _errors{std::move(error)} {}

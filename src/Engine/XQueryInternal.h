@@ -9,12 +9,14 @@
 #include "xquery/Warnings.h"
 #include "xquery/XQuery.h"
 
+#include <chrono>
 #include <memory>
 #include <vector>
 
 namespace xquery {
 
 class XQueryPlanReport;
+struct XQueryProfiledProgram;
 class XQueryProlog;
 
 class XQueryInternal {
@@ -38,10 +40,17 @@ class XQueryInternal {
   const std::vector<XQueryWarning>& warnings() const { return _warnings; }
   // Of a query that was compiled to be streamed, and without errors; else null.
   const XQueryStreamProgram* streamProgram() const { return _streamProgram.get(); }
+  // Of a query that was compiled to be profiled, and without errors; else null.
+  const std::shared_ptr<const XQueryProfiledProgram>& profiledProgram() const {
+    return _profiledProgram;
+  }
 
  private:
+  void compile(const Ref<NSString>& source, const XQueryLoading& loading, XQueryWay way);
   void plan(XQueryWay way);
   void planStream();
+  void planToProfile();
+  void completeProfiledProgram(const Ref<NSString>& source, std::chrono::nanoseconds taken);
 
   Ref<XQueryProlog> _prolog;
   Ref<XQueryExpr> _body;
@@ -49,6 +58,7 @@ class XQueryInternal {
   std::unique_ptr<const XQueryPlanReport> _planReport;
   std::vector<XQueryWarning> _warnings;
   std::unique_ptr<const XQueryStreamProgram> _streamProgram;
+  std::shared_ptr<const XQueryProfiledProgram> _profiledProgram;
 };
 
 }  // namespace xquery

@@ -1,6 +1,7 @@
 #include "Plan/Plan.h"
 
 #include "Plan/Planning.h"
+#include "Plan/Profile/XQueryProfiledProgram.h"
 
 #include <cstdlib>
 #include <string_view>
@@ -41,6 +42,17 @@ Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>&
   std::vector<XQueryPlanNote> notes;
   applyRules(planning, XQueryRules(), &notes);
   report = XQueryPlanReport(planning, std::move(notes));
+  return program.install();
+}
+
+Ref<XQueryExpr> XQueryProfiled(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
+                               XQueryProfiledProgram& profiled) {
+  XQueryProgram program(prolog, body);
+  XQueryPlanning planning(program);
+  std::vector<XQueryPlanNote> notes;
+  if (XQueryPlanIsEnabled()) applyRules(planning, XQueryRules(), &notes);
+  const XQueryPlanReport report(planning, std::move(notes));
+  XQueryProfileProgram(planning, report, prolog, profiled);
   return program.install();
 }
 

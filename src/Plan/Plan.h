@@ -18,6 +18,7 @@
 namespace xquery {
 
 class XQueryProlog;
+struct XQueryProfiledProgram;
 
 // Whether queries are planned: unless the environment variable XQUERY_PLAN is "0". Read anew at
 // each call.
@@ -31,5 +32,9 @@ Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>&
 // The same, and what there is to say of it.
 Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
                               XQueryPlanReport& report);
+// The same, or where queries are not planned the program as it is written, with expressions that
+// count in it; and what there is to say of these.
+Ref<XQueryExpr> XQueryProfiled(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
+                               XQueryProfiledProgram& profiled);
 
 }  // namespace xquery

@@ -6,6 +6,7 @@
 #include "Plan/Rules.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryDeclarations.h"
+#include "Prolog/XQueryProlog.h"
 #include "Types/XQueryQName.h"
 
 #include <algorithm>
@@ -45,19 +46,28 @@ class Listing {
     if (!body.expr) return;
     std::string label = "query";
     if (body.function) {
-      label = "function " + nameOf(*body.function->name()) + "#" +
+      label = "function " + nameOf(*body.function->name(), *body.prolog) + "#" +
               std::to_string(body.function->params().size());
     } else if (body.variable) {
-      label = "variable $" + nameOf(*body.variable->name());
+      label = "variable $" + nameOf(*body.variable->name(), *body.prolog);
     }
     const XQueryFacts& facts = _planning.facts[body.place];
-    _entries.push_back({0, {}, std::move(label), 0, XQueryLabelOfItems(facts), {}, {}});
+    _entries.push_back(
+        {0, {}, std::move(label), 0, XQueryLabelOfItems(facts), {}, {}, body.place, true});
   }
 
-  // The prefix is not known any more.
-  static std::string nameOf(const XQueryQName& name) {
-    const std::string space = name.namespaceURI() ? name.namespaceURI()->utf8() : std::string();
-    return (space.empty() ? "" : "{" + space + "}") + name.localPart()->utf8();
+  // With a prefix that the module has for the namespace; the one that was written is not known any
+  // more.
+  static std::string nameOf(const XQueryQName& name, const XQueryProlog& prolog) {
+    const std::string local = name.localPart()->utf8();
+    const auto& space = name.namespaceURI();
+    if (!space || space->length() == 0) return local;
+    const Value known = prolog.prefixesForID(prolog.namespaceID(space));
+    const auto* several = dyn_cast<NSArray>(known);
+    const auto* prefix = several && several->count() ? cast<NSString>(several->objectAtIndex(0))
+                                                     : dyn_cast<NSString>(known);
+    const bool isKnown = prefix && prefix->length() > 0;
+    return (isKnown ? prefix->utf8() + ":" : "{" + space->utf8() + "}") + local;
   }
 
   void add(XQueryPlaceID place) {
@@ -75,7 +85,7 @@ class Listing {
     const XQueryFacts& facts = _planning.facts[place];
     _entries.push_back({_depths[place], std::exchange(_roles[place], {}), XQueryLabelOf(*at.expr),
                         _lines[place], XQueryLabelOfItems(facts), XQueryLabelsOfDeeds(facts.deeds),
-                        std::move(notes)});
+                        std::move(notes), place, false});
   }
 
   bool isPassedOver(XQueryPlaceID place) const {

@@ -28,6 +28,8 @@ class XQueryPlanReport {
     std::string items;
     std::vector<std::string_view> deeds;
     std::vector<Note> notes;  // in the order of the rules
+    uint32_t place = 0;       // in the program
+    bool isBody = false;      // the body as a whole, which has a line of its own before its place
   };
 
   XQueryPlanReport() = default;

@@ -190,6 +190,8 @@ TEST(GeneratedPrograms, AnswerTheSamePlannedAndPlain) {
     const Outcome plain = outcomeOf(*compiled(text), contextItem, {}, limits(plainDuration));
     if (endedAtLimit(plain)) return;
     EXPECT_EQ(plain.lines, outcomeOf(*planned, contextItem, {}, limits(plannedDuration)).lines);
+    const auto profiled = compiled(text, XQueryWay::Profiled);
+    EXPECT_EQ(plain.lines, outcomeOf(*profiled, contextItem, {}, limits(plannedDuration)).lines);
     values += plain.lines.empty() || plain.lines.front().starts_with("error") ? 0 : 1;
   });
   EXPECT_GT(operators, programs / fewestPart);

@@ -1,5 +1,5 @@
-// Runs the whole-query cases under tests/queries/cases, each of them plain and planned, and record
-// by record where that can be done. A file holds any number of cases:
+// Runs the whole-query cases under tests/queries/cases, each of them plain, planned and
+// profiled, and record by record where that can be done. A file holds any number of cases:
 //
 //   == what the case shows
 //   -- var n=5                      (optional, repeatable: an untyped atomic external variable)
@@ -179,6 +179,7 @@ class QueryCase : public testing::Test {
   void TestBody() override {
     const std::pair<XQueryWay, const char*> ways[] = {{XQueryWay::Plain, "plain"},
                                                       {XQueryWay::Planned, "planned"},
+                                                      {XQueryWay::Profiled, "profiled"},
                                                       {XQueryWay::Streamed, "streamed"}};
     for (const auto& [way, name] : ways) {
       SCOPED_TRACE(name);
