@@ -41,6 +41,7 @@ Ref<XQuery> compile(const Options& options, const Ref<NSString>& source) {
   const UnderWay compiling;
   const XQueryWay way = options.stream                  ? XQueryWay::Streamed
                         : options.plan || options.check ? XQueryWay::Explained
+                        : options.profileFile           ? XQueryWay::Profiled
                                                         : XQueryWay::Planned;
   Ref<XQuery> query = XQuery::xqueryWithSource(source, loading(options), limits(options), way);
   const Ref<NSArray> errors = query->parseErrors();

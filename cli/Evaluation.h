@@ -30,6 +30,8 @@ class Evaluation {
                       const std::function<bool(const xquery::Value& item)>& receive,
                       xquery::XQueryStreamFailure& failure);
 
+  const xquery::XQueryContext& context() const { return *_context; }
+
  private:
   const xquery::Ref<xquery::XQueryContext> _context;
 };

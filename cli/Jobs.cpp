@@ -30,7 +30,7 @@ unsigned numberOfJobs(const Options& options, size_t inputs) {
 class Jobs {
  public:
   Jobs(const Options& options, const XQuery& query, const XQueryConstants& constants,
-       const std::optional<std::vector<Input>>& inputs, Phases& phases)
+       const std::optional<std::vector<Input>>& inputs, Phases& phases, Profile* profile)
       : _options(options),
         _query(query),
         _constants(constants),
@@ -38,7 +38,8 @@ class Jobs {
         _parts(inputs ? inputs->size() : 1),
         _jobs(numberOfJobs(options, _parts)),
         _results(options, framing(options), _jobs),
-        _phases(phases) {}
+        _phases(phases),
+        _profile(profile) {}
 
   Status run();
 
@@ -48,6 +49,8 @@ class Jobs {
   void work();
   void makePart(size_t number, Phases& phases);
   Ref<NSArray> resultOf(const Input* input, Phases& phases) const;
+  Ref<NSArray> evaluated(const Value& contextItem, Phases& phases) const;
+  void endIfInterrupted();
   // What is said about one of several inputs names it, and what is said to a program always.
   std::string reported(const Input* input, const Failure& failure) const;
 
@@ -63,7 +66,16 @@ class Jobs {
   std::mutex _mutex;
   Phases& _phases;
   const std::shared_ptr<MissingDocuments> _missing = std::make_shared<MissingDocuments>(_options);
+  Profile* const _profile;  // null where none is asked for
 };
+
+void Jobs::endIfInterrupted() {
+  if (_profile && interruption()->load()) {
+    const std::lock_guard lock(_mutex);
+    _profile->writeAnyway(_phases);
+  }
+  cli::endIfInterrupted();
+}
 
 // This thread works too, so that all is done even where no other can be started.
 Status Jobs::run() {
@@ -128,14 +140,25 @@ Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) const {
     if (!input) return nullptr;
     return readDocument(_options, input->path, _options.html ? Markup::HTML : Markup::XML);
   });
+  Ref<NSArray> items = evaluated(contextItem, phases);
+  if (interruption()->load()) throw Failure{};
+  return items;
+}
+
+Ref<NSArray> Jobs::evaluated(const Value& contextItem, Phases& phases) const {
   Evaluation evaluation(_options, _missing);
   Ref<NSArray> items;
-  for (unsigned n = 0; n < _options.repeat; n++) {
-    items = nullptr;
-    items = phases.evaluate.measure(
-        [&] { return evaluation.evaluate(_query, _constants, contextItem); });
+  try {
+    for (unsigned n = 0; n < _options.repeat; n++) {
+      items = nullptr;
+      items = phases.evaluate.measure(
+          [&] { return evaluation.evaluate(_query, _constants, contextItem); });
+    }
+  } catch (const Failure&) {
+    if (_profile) _profile->add(evaluation.context(), true);
+    throw;
   }
-  if (interruption()->load()) throw Failure{};
+  if (_profile) _profile->add(evaluation.context(), false);
   return items;
 }
 
@@ -147,8 +170,8 @@ std::string Jobs::reported(const Input* input, const Failure& failure) const {
 }  // namespace
 
 Status runJobs(const Options& options, const XQuery& query, const XQueryConstants& constants,
-               const std::optional<std::vector<Input>>& inputs, Phases& phases) {
-  return Jobs(options, query, constants, inputs, phases).run();
+               const std::optional<std::vector<Input>>& inputs, Phases& phases, Profile* profile) {
+  return Jobs(options, query, constants, inputs, phases, profile).run();
 }
 
 }  // namespace cli

@@ -11,9 +11,11 @@
 #include <CLI/CLI.hpp>
 
 #include <algorithm>
+#include <filesystem>
 #include <memory>
 #include <sstream>
 #include <string_view>
+#include <system_error>
 #include <unistd.h>
 #include <utility>
 
@@ -158,6 +160,29 @@ void interpretArguments(const CLI::App& app, Options& options) {
   options.inputs.erase(options.inputs.begin());
 }
 
+bool isSameFile(const std::string& a, const std::string& b) {
+  std::error_code unknown;
+  return a == b || std::filesystem::equivalent(a, b, unknown);
+}
+
+// What is not evaluated as a whole has no profile. Whoever forgets to name a file has named
+// something else, which must not be overwritten.
+void checkProfile(const Options& options) {
+  if (!options.profileFile) return;
+  const char* const other = options.check    ? "--check"
+                            : options.plan   ? "--plan"
+                            : options.stream ? "--stream"
+                                             : nullptr;
+  if (other) throw WrongUsage("--profile does not go with " + std::string(other));
+  std::vector<std::string> others = options.inputs;
+  if (!options.queryText) others.push_back(options.queryFile);
+  if (options.outputFile) others.push_back(*options.outputFile);
+  for (const std::string& path : others) {
+    if (!isSameFile(path, *options.profileFile)) continue;
+    throw WrongUsage("--profile: " + path + " is named as something else too");
+  }
+}
+
 void checkTogether(const Options& options) {
   const bool isWhole = options.format == Format::XML || options.format == Format::JSON;
   if (isWhole && options.separator) {
@@ -166,6 +191,7 @@ void checkTogether(const Options& options) {
   if (options.indent && (options.format == Format::HTML || options.format == Format::Text)) {
     throw WrongUsage("--indent does not go with --as html and --as text");
   }
+  checkProfile(options);
 }
 
 ptrdiff_t readersBesideInputs(const Options& options) {

@@ -52,6 +52,7 @@ struct Options {
   bool time = false;
   bool stream = false;                           // there is an input then, or a plan is asked for
   std::optional<xquery::XQueryPlanFormat> plan;  // to be shown instead of the result
+  std::optional<std::string> profileFile;
   unsigned repeat = 1;
   unsigned jobs = 0;  // 0: as many as there are processors
   bool withName = false;

@@ -114,6 +114,14 @@ void takeSeparator(const OptionRow& row, const std::string& text, Options& optio
   options.separator = separator;
 }
 
+void takeProfile(const OptionRow& row, const std::string& path, Options& options) {
+  const auto isNamed = [&](std::string_view ending) { return path.ends_with(ending); };
+  if (!isNamed(".json") && !isNamed(".txt") && !isNamed(".html")) {
+    refuse(row, "a file named .html, .json or .txt", path);
+  }
+  options.profileFile = path;
+}
+
 // --- limits --------------------------------------------------------------------------------------
 
 void takeTimeout(const OptionRow& row, const std::string& text, Options& options) {
@@ -232,6 +240,10 @@ constexpr OptionRow rows[] = {
     {ofReports, "--plan", Takes::MaybeValue, "text|json|dot", Offers::Words,
      "Show how the query is evaluated instead of its result",
      choose<&Options::plan, XQueryPlanFormat>},
+    {ofReports, "--profile", Takes::Value, "FILE", Offers::Files,
+     "Write where the time of the evaluation went to a file, by its name a page (.html), text "
+     "(.txt) or .json",
+     takeProfile},
     {ofReports, "--time", Takes::Nothing, "", Offers::Nothing,
      "Report the time of each phase on standard error", set<&Options::time>},
     {ofReports, "--repeat", Takes::Value, "N", Offers::Nothing,

@@ -47,7 +47,7 @@ ResultFile::~ResultFile() {
   if (_isOwned && _file >= 0) close(_file);
   if (_temporary.empty()) return;
   unlink(_temporary.c_str());
-  removeAtEnd({});
+  keepAtEnd(_temporary);
 }
 
 int ResultFile::open(const std::string& path) {
@@ -111,7 +111,7 @@ bool ResultFile::finish() {
   if (_isOwned && file >= 0 && close(file) != 0) return fail();
   if (_temporary.empty()) return true;
   if (std::rename(_temporary.c_str(), _target.c_str()) != 0) return fail();
-  removeAtEnd({});
+  keepAtEnd(_temporary);
   _temporary.clear();
   return true;
 }

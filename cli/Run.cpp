@@ -6,6 +6,7 @@
 #include "Jobs.h"
 #include "Messages.h"
 #include "Output.h"
+#include "Profile.h"
 #include "Reports.h"
 #include "Session.h"
 #include "Signals.h"
@@ -38,6 +39,22 @@ void reportWarnings(const Options& options, const XQuery& query, const Ref<NSStr
   writeMessage(report(options, XQueryWarnings(*compile(whole, source))));
 }
 
+// The profile is written of all that was evaluated, whatever became of it.
+Status evaluateAll(const Options& options, const XQuery& query, const XQueryConstants& constants,
+                   const std::optional<std::vector<Input>>& inputs, Phases& phases) {
+  std::optional<Profile> profile;
+  if (options.profileFile) profile.emplace(options, query);
+  try {
+    const Status status =
+        runJobs(options, query, constants, inputs, phases, profile ? &*profile : nullptr);
+    if (profile) profile->write(phases);
+    return status;
+  } catch (const Failure&) {
+    if (profile) profile->writeAnyway(phases);
+    throw;
+  }
+}
+
 Status runPhases(const Options& options) {
   Phases phases;
   const Ref<NSString> source = queryText(options);
@@ -58,7 +75,7 @@ Status runPhases(const Options& options) {
   }
   std::optional<std::vector<Input>> inputs;
   if (options.hasInputs()) inputs = inputsOf(options);
-  const Status status = runJobs(options, *query, constants, inputs, phases);
+  const Status status = evaluateAll(options, *query, constants, inputs, phases);
   if (options.time && (status == StatusResult || status == StatusFalse))
     phases.report(options.repeat > 1);
   return status;

@@ -14,8 +14,12 @@
 namespace cli {
 namespace {
 
-char temporary[PATH_MAX];
-std::atomic<bool> hasTemporary = false;
+// The result and the profile.
+struct Temporary {
+  char path[PATH_MAX];
+  std::atomic<bool> isThere = false;
+};
+Temporary temporaries[2];
 termios terminal;
 std::atomic<bool> hasTerminal = false;
 
@@ -33,10 +37,18 @@ void prepareStandardStreams() {
 }
 
 void removeAtEnd(const std::string& path) {
-  hasTemporary = false;
-  if (path.empty() || path.size() >= sizeof temporary) return;
-  std::memcpy(temporary, path.c_str(), path.size() + 1);
-  hasTemporary = true;
+  for (Temporary& each : temporaries) {
+    if (each.isThere || path.size() >= sizeof each.path) continue;
+    std::memcpy(each.path, path.c_str(), path.size() + 1);
+    each.isThere = true;
+    return;
+  }
+}
+
+void keepAtEnd(const std::string& path) {
+  for (Temporary& each : temporaries) {
+    if (each.isThere && path == each.path) each.isThere = false;
+  }
 }
 
 void restoreTerminalAtEnd() {
@@ -48,7 +60,9 @@ void endOfClosedPipe() {
 }
 
 void endBySignal(int signal) {
-  if (hasTemporary) unlink(temporary);
+  for (const Temporary& each : temporaries) {
+    if (each.isThere) unlink(each.path);
+  }
   if (hasTerminal) {
     std::signal(SIGTTOU, SIG_IGN);  // which stops who is in the background
     tcsetattr(STDIN_FILENO, TCSANOW, &terminal);

@@ -19,8 +19,10 @@ void prepareStandardStreams();
 // whose reader had enough; without a message.
 [[noreturn]] void endOfClosedPipe();
 
-// The file that must not be left behind by a process that ends so; an empty path for none.
+// A file that must not be left behind by a process that ends so, of which there may be two at a
+// time; and one that need not be removed any more.
 void removeAtEnd(const std::string& path);
+void keepAtEnd(const std::string& path);
 
 // The terminal on standard input is left by a process that ends so as it is now.
 void restoreTerminalAtEnd();

@@ -12,6 +12,12 @@ void Phase::add(const Phase& other) {
   _milliseconds.insert(_milliseconds.end(), other._milliseconds.begin(), other._milliseconds.end());
 }
 
+std::chrono::nanoseconds Phase::sum() const {
+  const std::chrono::duration<double, std::milli> all(
+      std::accumulate(_milliseconds.begin(), _milliseconds.end(), 0.0));
+  return std::chrono::duration_cast<std::chrono::nanoseconds>(all);
+}
+
 std::string Phase::report(bool statistics) const {
   std::vector<double> sorted = _milliseconds;
   std::sort(sorted.begin(), sorted.end());

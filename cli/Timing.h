@@ -24,6 +24,7 @@ class Phase {
   }
 
   void add(const Phase& other);
+  std::chrono::nanoseconds sum() const;
 
   // One line: the time in sum, or with `statistics` the median and the minimum.
   std::string report(bool statistics) const;
