@@ -67,17 +67,12 @@ void lookAtCollection(XQueryChecking& checking, XQueryPlaceID call, std::string_
   checking.warn(call, ID::AbsentFunction, {std::string(name), "doc() for each document"});
 }
 
-bool isUntypedText(const XQueryChecking& checking, XQueryPlaceID place) {
-  const std::string_view name = checking.functionCalledIn(place);
-  return name == "concat" || name == "replace" || name == "tokenize";
-}
-
 void lookAtExtreme(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
   const XQueryPlaceID items = checking.argument(call, 0);
   const XQueryFacts& facts = checking.factsOf(items);
   if (facts.most > 0 && facts.are(URI)) {
     checking.warn(call, ID::AggregateOfURIs, {std::string(name)});
-  } else if (isUntypedText(checking, items)) {
+  } else if (checking.givesUntypedText(items)) {
     checking.warn(
         call, ID::UntypedText,
         {std::string(checking.functionCalledIn(items)), "is a number for " + std::string(name)});
@@ -215,11 +210,6 @@ void lookAtPosition(XQueryChecking& checking, XQueryPlaceID call, std::string_vi
 }
 
 // Which argument is a collation.
-constexpr std::string_view codepointCollation =
-    "http://www.w3.org/2004/10/xpath-functions/collation/codepoint";
-constexpr std::string_view finalCodepointCollation =
-    "http://www.w3.org/2005/xpath-functions/collation/codepoint";
-
 struct Collated {
   std::string_view name;
   size_t index;
@@ -247,7 +237,7 @@ void checkCollation(XQueryChecking& checking, XQueryPlaceID call, std::string_vi
     if (checking.functionCalledIn(place) == "default-collation") return;
     const auto* text = checking.textIn(place);
     const std::string URI = text ? text->utf8() : std::string();
-    if (URI == codepointCollation || URI == finalCodepointCollation) return;
+    if (XQueryIsCodepointCollation(URI)) return;
     checking.warn(place, ID::Collation, {checking.labelOf(place)});
   }
 }

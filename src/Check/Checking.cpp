@@ -179,6 +179,19 @@ const NSString* XQueryChecking::textIn(XQueryPlaceID place) const {
   return dyn_cast<NSString>(literalIn(place));
 }
 
+bool XQueryChecking::givesUntypedText(XQueryPlaceID place) const {
+  if (place == XQueryNoPlace) return false;
+  const std::string_view name = functionCalledIn(place);
+  return name == "concat" || name == "replace" || name == "tokenize";
+}
+
+bool XQueryChecking::mayWellBeEmpty(XQueryPlaceID place) const {
+  const XQueryFacts& known = factsOf(place);
+  if (known.least > 0) return false;
+  const Kind kind = at(program.withoutParentheses(place)).expr->kind();
+  return known.most == 0 || kind == Kind::PathExpr || kind == Kind::FLWORExpr;
+}
+
 std::string XQueryChecking::labelOf(XQueryPlaceID place) const {
   return XQueryLabelOf(*at(program.withoutParentheses(place)).expr);
 }
@@ -188,6 +201,11 @@ XQueryItemKinds XQueryChecking::atomicKinds(XQueryPlaceID place) const {
   const XQueryItemKinds kinds = factsOf(place).kinds;
   if (kinds & XQueryItems::Other) return XQueryItems::None;
   return XQueryAtomizedKinds(kinds);
+}
+
+bool XQueryIsCodepointCollation(std::string_view URI) {
+  return URI == "http://www.w3.org/2004/10/xpath-functions/collation/codepoint" ||
+         URI == "http://www.w3.org/2005/xpath-functions/collation/codepoint";
 }
 
 // --- names of kinds ------------------------------------------------------------------------------

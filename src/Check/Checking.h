@@ -64,6 +64,11 @@ class XQueryChecking {
   const NSObject* literalIn(XQueryPlaceID place) const;
   // A literal that is a text; none for anything else.
   const NSString* textIn(XQueryPlaceID place) const;
+  // Whether it is a call that gives texts as untyped values, where XQuery 1.0 has strings.
+  bool givesUntypedText(XQueryPlaceID place) const;
+  // Whether it is a search that may find nothing, or is nothing. Of what a variable or a function
+  // gives that is hardly ever known.
+  bool mayWellBeEmpty(XQueryPlaceID place) const;
   // What was written, as far as a message needs it.
   std::string labelOf(XQueryPlaceID place) const;
   const XQueryFacts& factsOf(XQueryPlaceID place) const { return facts[place]; }
@@ -103,7 +108,10 @@ class XQueryChecking {
   std::unordered_map<const XQueryProlog*, std::unordered_map<std::string, Functions>> _functions;
 };
 
-// "a string", "strings or numbers": kinds of values for people.
+// Whether a collation is the order of code points, by which all text is compared.
+bool XQueryIsCodepointCollation(std::string_view URI);
+
+// "a string", "a number": kinds of values for people.
 std::string XQueryNameOfKinds(XQueryItemKinds kinds);
 
 // --- families ------------------------------------------------------------------------------------

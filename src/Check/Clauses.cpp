@@ -19,11 +19,6 @@ void checkKey(XQueryChecking& checking, XQueryPlaceID spec) {
   checking.warn(key, ID::OrderKey, {XQueryNameOfKinds(facts.kinds)});
 }
 
-bool isCodepointCollation(NSStringView URI) {
-  return URI == "http://www.w3.org/2004/10/xpath-functions/collation/codepoint" ||
-         URI == "http://www.w3.org/2005/xpath-functions/collation/codepoint";
-}
-
 }  // namespace
 
 void XQueryCheckFLWOR(XQueryChecking& checking, XQueryPlaceID place) {
@@ -36,7 +31,7 @@ void XQueryCheckFLWOR(XQueryChecking& checking, XQueryPlaceID place) {
     if (!spec) continue;
     if (spec->ascending() != first.ascending()) checking.warn(part, ID::OrderDirections);
     if (spec->emptyLeast() != first.emptyLeast()) checking.warn(part, ID::OrderEmpty);
-    if (spec->collation() && !isCodepointCollation(spec->collation()->view())) {
+    if (spec->collation() && !XQueryIsCodepointCollation(spec->collation()->utf8())) {
       checking.warn(part, ID::Collation, {"\"" + spec->collation()->utf8() + "\""});
     }
     checkKey(checking, part);
@@ -65,11 +60,7 @@ bool isHarmless(const XQueryChecking& checking, XQueryPlaceID whole, XQueryPlace
 
 bool mayWellBeEmpty(const XQueryChecking& checking, XQueryPlaceID clause) {
   const XQueryPlaceID bound = checking.program.part(clause, XQueryRole::Bound);
-  if (bound == XQueryNoPlace) return true;
-  const XQueryFacts& facts = checking.factsOf(bound);
-  const Kind kind = checking.at(checking.program.withoutParentheses(bound)).expr->kind();
-  const bool isSearch = kind == Kind::PathExpr || kind == Kind::FLWORExpr;
-  return facts.least == 0 && (isSearch || facts.most == 0);
+  return bound == XQueryNoPlace || checking.mayWellBeEmpty(bound);
 }
 
 }  // namespace

@@ -96,13 +96,8 @@ void checkNaN(XQueryChecking& checking, XQueryPlaceID place, const Sides& sides)
 
 // --- texts that are untyped ----------------------------------------------------------------------
 
-bool givesUntypedText(const XQueryChecking& checking, XQueryPlaceID place) {
-  const std::string_view name = checking.functionCalledIn(place);
-  return name == "concat" || name == "replace" || name == "tokenize";
-}
-
 void checkUntypedText(XQueryChecking& checking, XQueryPlaceID text, XQueryPlaceID other) {
-  if (!givesUntypedText(checking, text) || other == XQueryNoPlace) return;
+  if (!checking.givesUntypedText(text) || other == XQueryNoPlace) return;
   const XQueryItemKinds kinds = checking.atomicKinds(other);
   if (kinds == None || (kinds & ~Numeric) != 0) return;
   checking.warn(text, ID::UntypedText,
@@ -199,23 +194,6 @@ void XQueryCheckOperator(XQueryChecking& checking, XQueryPlaceID place) {
 
 // --- comparisons with nothing --------------------------------------------------------------------
 
-namespace {
-
-// Paths and their kin may find nothing; of what a variable or a function gives that is not known.
-bool mayWellBeEmpty(const XQueryChecking& checking, XQueryPlaceID place) {
-  if (checking.factsOf(place).least > 0) return false;
-  const XQueryPlaceID inner = checking.program.withoutParentheses(place);
-  switch (checking.at(inner).expr->kind()) {
-    case Kind::PathExpr:
-    case Kind::FLWORExpr:
-      return true;
-    default:
-      return checking.factsOf(inner).most == 0;
-  }
-}
-
-}  // namespace
-
 void XQueryCheckEmptyComparisons(XQueryChecking& checking, const XQueryUses& uses) {
   WorkPacer pacer;
   for (XQueryPlaceID place = 0; place < checking.program.placeCount(); ++place) {
@@ -227,7 +205,7 @@ void XQueryCheckEmptyComparisons(XQueryChecking& checking, const XQueryUses& use
     const XQueryPlaceID left = checking.leftOperand(place);
     const XQueryPlaceID right = checking.rightOperand(place);
     if (left == XQueryNoPlace) continue;
-    if (!mayWellBeEmpty(checking, left) && !mayWellBeEmpty(checking, right)) continue;
+    if (!checking.mayWellBeEmpty(left) && !checking.mayWellBeEmpty(right)) continue;
     if (!uses.isAskedForTruthOnly(place)) checking.warn(place, ID::EmptyComparison);
   }
 }

@@ -28,12 +28,6 @@ bool mayMakeElements(const XQueryChecking& checking) {
          facts.mayBe(XQueryItems::Element | XQueryItems::Document);
 }
 
-bool isCodepointCollation(const Ref<NSString>& URI) {
-  const std::string text = textOf(URI);
-  return text == "http://www.w3.org/2004/10/xpath-functions/collation/codepoint" ||
-         text == "http://www.w3.org/2005/xpath-functions/collation/codepoint";
-}
-
 void tell(XQueryChecking& checking, const XQueryProlog& module, const XQueryRemark& remark) {
   const std::string first = textOf(remark.first);
   const auto warn = [&](ID id, XQueryChecking::Parts parts = {}) {
@@ -55,7 +49,7 @@ void tell(XQueryChecking& checking, const XQueryProlog& module, const XQueryRema
     case Matter::SchemaImport:
       return warn(ID::SchemaImport, {first});
     case Matter::DefaultCollation:
-      if (!isCodepointCollation(remark.first)) warn(ID::Collation, {"\"" + first + "\""});
+      if (!XQueryIsCodepointCollation(first)) warn(ID::Collation, {"\"" + first + "\""});
       return;
     case Matter::BaseURI:
       if (&module == &checking.main && mayMakeElements(checking)) warn(ID::BaseURI);

@@ -63,11 +63,9 @@ bool warnOfOperand(XQueryChecking& checking, XQueryPlaceID place, const XQueryTy
                   {checking.inside<XQueryVariable>(operand)->name()->utf8(), XQueryLabelOf(type)});
     return true;
   }
-  const std::string_view name =
-      operand == XQueryNoPlace ? std::string_view() : checking.functionCalledIn(operand);
-  const bool isUntyped = name == "concat" || name == "replace" || name == "tokenize";
-  if (!isUntyped || !isString(type)) return false;
-  checking.warn(place, ID::UntypedText, {std::string(name), "is no " + XQueryLabelOf(type)});
+  if (!checking.givesUntypedText(operand) || !isString(type)) return false;
+  checking.warn(place, ID::UntypedText,
+                {std::string(checking.functionCalledIn(operand)), "is no " + XQueryLabelOf(type)});
   return true;
 }
 
