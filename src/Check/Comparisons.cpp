@@ -15,8 +15,10 @@ using namespace XQueryItems;
 
 constexpr int classArithmetic = 2;
 constexpr int classRange = 3;
+constexpr int classSequence = 4;
 constexpr int classValue = 5;
 constexpr int classGeneral = 6;
+constexpr int classNode = 7;
 
 constexpr XQueryItemKinds instants = DateTime | Date | Time;
 
@@ -145,7 +147,7 @@ bool checkOperand(XQueryChecking& checking, XQueryPlaceID whole, XQueryPlaceID o
   constexpr XQueryItemKinds possible = Numeric | Untyped | instants | Duration;
   const XQueryItemKinds kinds = checking.atomicKinds(operand);
   if (kinds == None || (kinds & possible) != 0) return true;
-  checking.warn(operand, ID::ArithmeticFails,
+  checking.warn(operand, ID::OperandFails,
                 {XQueryNameOfKinds(kinds), XQueryLabelOf(*checking.at(whole).expr)});
   return false;
 }
@@ -169,6 +171,17 @@ void checkArithmetic(XQueryChecking& checking, XQueryPlaceID place, int type) {
   if (isUntyped(left) || isUntyped(right)) checking.warn(place, ID::UntypedIdiv);
 }
 
+// Of "union" and its kin, and of "is" and its kin.
+void checkNodes(XQueryChecking& checking, XQueryPlaceID place) {
+  for (const XQueryPlaceID side : {checking.leftOperand(place), checking.rightOperand(place)}) {
+    if (side == XQueryNoPlace) continue;
+    const XQueryFacts& facts = checking.factsOf(side);
+    if (facts.most == 0 || !facts.are(Atomic)) continue;
+    checking.warn(side, ID::OperandFails,
+                  {XQueryNameOfKinds(facts.kinds), XQueryLabelOf(*checking.at(place).expr)});
+  }
+}
+
 void checkRange(XQueryChecking& checking, XQueryPlaceID place) {
   for (const XQueryPlaceID bound : {checking.leftOperand(place), checking.rightOperand(place)}) {
     if (bound == XQueryNoPlace) continue;
@@ -186,6 +199,9 @@ void XQueryCheckOperator(XQueryChecking& checking, XQueryPlaceID place) {
   const int operatorClass = XQueryOperatorExpr::operatorClassification(type);
   if (operatorClass == classArithmetic) return checkArithmetic(checking, place, type);
   if (operatorClass == classRange) return checkRange(checking, place);
+  if (operatorClass == classSequence || operatorClass == classNode) {
+    return checkNodes(checking, place);
+  }
   if (operatorClass != classValue && operatorClass != classGeneral) return;
   const Sides sides{checking.leftOperand(place), checking.rightOperand(place), type,
                     operatorClass == classGeneral};

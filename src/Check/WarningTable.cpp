@@ -43,8 +43,7 @@ constexpr auto rows = std::to_array<XQueryWarningRow>({
 
     {ID::ComparisonFails, "comparison-fails", "… cannot be compared with … by …",
      "fails when it is reached"},
-    {ID::ArithmeticFails, "arithmetic-fails", "… cannot be an operand of …",
-     "fails when it is reached"},
+    {ID::OperandFails, "operand-fails", "… cannot be an operand of …", "fails when it is reached"},
     {ID::URIComparison, "uri-comparison", "a URI cannot be compared with … by …: use string()",
      "XQuery 1.0 compares URIs as strings"},
     {ID::DurationComparison, "duration-comparison", "… cannot be compared with … by …",

@@ -30,7 +30,7 @@ enum class XQueryWarningID : uint8_t {
   StepFromValue,
   // Operators.
   ComparisonFails,
-  ArithmeticFails,
+  OperandFails,
   URIComparison,
   DurationComparison,
   DateAndTime,

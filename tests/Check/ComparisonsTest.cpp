@@ -91,10 +91,13 @@ TEST(CheckedComparisons, OfTextsThatAreUntyped) {
 
 TEST(CheckedOperators, Arithmetic) {
   expectWarnings({
-      {"'1' + 1", "1 arithmetic-fails"},
-      {"2 * count(//a) div string(//b[1])", "1 arithmetic-fails"},
-      {"-'a'", "1 arithmetic-fails"},
+      {"'1' + 1", "1 operand-fails"},
+      {"2 * count(//a) div string(//b[1])", "1 operand-fails"},
+      {"-'a'", "1 operand-fails"},
       {"//a[1] + //b[1], -//a[1], current-date() - xdt:dayTimeDuration('P1D')", ""},
+      {"//a[1] is 3", "1 operand-fails"},
+      {"//a union\n(1, 2)", "2 operand-fails"},
+      {"//a[1] is //b[1], //a union //b, () union //a, //a[1] << $unknown/b", "1 unknown-variable"},
       {"//a[1] idiv 2", "1 untyped-idiv"},
       {"number(//a[1]) idiv 2, 7 idiv 2", ""},
       {"1.5 to 3", "1 range-of-fractions"},
