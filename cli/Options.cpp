@@ -136,6 +136,7 @@ bool beginsSession(const Options& options) {
 void checkSession(const Options& options) {
   const std::pair<bool, const char*> wrong[] = {{options.outputFile.has_value(), "-o"},
                                                 {options.filesFrom.has_value(), "--files-from"},
+                                                {options.profileFile.has_value(), "--profile"},
                                                 {options.jobs > 0, "--jobs"},
                                                 {options.stream, "--stream"},
                                                 {options.check, "--check"},
