@@ -28,7 +28,8 @@
 //                 nodes are not looked at.
 //   alongWays     Steps down from the document by names alone, "/site/people/person", find what the
 //                 index of the tree knows of its ways: their number, and the nodes where these are
-//                 all of their name. What comes behind such steps goes on from there.
+//                 all of their name. What comes behind such steps goes on from there. Predicates
+//                 that look up by names alone (asksForWays) are asked once for each way.
 //   filtersEach   Where only some of the nodes are wanted, or their number, a step filters each
 //                 node as it finds it and hands it on, so that the walk ends as soon as the answer
 //                 is certain.

@@ -16,7 +16,7 @@ namespace xquery {
 // What the first steps ask for.
 class XQueryPathWalk::Ways {
  public:
-  explicit Ways(XQueryPathWalk& walk) {
+  explicit Ways(XQueryPathWalk& walk) : _walk(walk) {
     bool isDeep = false;
     for (size_t index = 0; index < walk._steps.size() && _count < most; ++index) {
       const XQueryWalkedStep& step = walk._steps[index];
@@ -28,37 +28,71 @@ class XQueryPathWalk::Ways {
       isDeep = isDeep || step.axis == XQueryAxisDescendant;
       if (step.axis != XQueryAxisChild && step.axis != XQueryAxisDescendant) return;
       if (step.hasPredicates() && !step.filtersEach) return;
-      if ((isDeep && !walk.orderIsFree) || !add(step, isDeep, walk)) return;
+      if ((isDeep && !walk.orderIsFree) || !add(step, isDeep)) return;
       _steps[_count - 1] = index + 1;
-      if (step.hasPredicates()) return;
+      if (step.hasPredicates() && !areAnswered(step)) return;
       isDeep = false;
     }
   }
 
   // Of one of them alone others know as much.
-  bool areOfUse() const { return _count > 1; }
+  bool areOfUse() const { return _count > 1 || (_count == 1 && _asked[0].step); }
   size_t count() const { return _count; }
   // Those behind which so many steps of the path, predicates of the last one apart, are done.
   std::span<const NSXMLWayStep> first(size_t count) const { return {_ways.data(), count}; }
   size_t stepsDone(size_t count) const { return _steps[count - 1]; }
   // Whether the last one looks for processing instructions as well.
   bool mayFindInstructions() const { return _mayFindInstructions; }
+  // Whether nothing is left to be asked of what all of them find.
+  bool areAllAnswered() const {
+    const XQueryWalkedStep& last = _walk._steps[_steps[_count - 1] - 1];
+    return !last.hasPredicates() || areAnswered(last);
+  }
 
  private:
   static constexpr size_t most = 12;
 
-  bool add(const XQueryWalkedStep& step, bool isDeep, XQueryPathWalk& walk) {
-    XQueryStepTest test(step, walk);
+  // Predicates that answer alike for all elements on a way are asked of the first of them.
+  struct Asked final : NSXMLNameSelection {
+    bool mayTake(const NSXMLExpandedName& name) const override {
+      if (way.name) return &name == way.name;
+      return !way.selection || way.selection->mayTake(name);
+    }
+    bool takes(const NSXMLNode& node) const override {
+      if (!way.name && way.selection && !way.selection->takes(node)) return false;
+      return walk->keepsAlone(*step, step->predicatesInTest, const_cast<NSXMLNode*>(&node));
+    }
+
+    NSXMLWayStep way;  // without them
+    const XQueryWalkedStep* step = nullptr;
+    XQueryPathWalk* walk = nullptr;
+  };
+
+  // Of nodes that are wanted by themselves, those of a name are asked in their turn.
+  bool areAnswered(const XQueryWalkedStep& step) const {
+    return step.asksForWays && _walk.results.countsOnly();
+  }
+  bool add(const XQueryWalkedStep& step, bool isDeep) {
+    XQueryStepTest test(step, _walk);
     NSXMLWayStep way{isDeep, test.onlyName(), nullptr};
     if (!way.name) way.selection = test.onlyNames();
     if (!test.takesElements()) return false;
     if (!way.name && !way.selection && !test.takesAllNamed()) return false;
     _mayFindInstructions = !way.name && test.acceptsInstructions();
+    if (step.hasPredicates() && areAnswered(step)) {
+      Asked& asked = _asked[_count];
+      asked.way = way;
+      asked.step = &step;
+      asked.walk = &_walk;
+      way = {isDeep, nullptr, &asked};
+    }
     _ways[_count++] = way;
     return true;
   }
 
+  XQueryPathWalk& _walk;
   std::array<NSXMLWayStep, most> _ways;
+  std::array<Asked, most> _asked;
   std::array<size_t, most> _steps{};
   size_t _count = 0;
   bool _mayFindInstructions = false;
@@ -66,7 +100,7 @@ class XQueryPathWalk::Ways {
 
 bool XQueryPathWalk::takeAlongWays(const Value& start) {
   const auto* document = dyn_cast<NSXMLDocument>(start.get());
-  if (!document || _steps.size() < 2 || setsEveryFocus || listingStep) return false;
+  if (!document || _steps.empty() || setsEveryFocus || listingStep) return false;
   const Ways ways(*this);
   if (!ways.areOfUse()) return false;
   const NSXMLIndexedWays known = NSXMLIndexedWays::of(document);
@@ -75,7 +109,7 @@ bool XQueryPathWalk::takeAlongWays(const Value& start) {
     return false;
   }
   const size_t all = ways.count();
-  const bool isWhole = ways.stepsDone(all) == _steps.size() && !_steps.back().hasPredicates();
+  const bool isWhole = ways.stepsDone(all) == _steps.size() && ways.areAllAnswered();
   const bool isSure = !ways.mayFindInstructions() || !known.elements->hasInstructions();
   if (isWhole && isSure && results.countsOnly()) {
     const auto number = known.elements->countAlong(ways.first(all));

@@ -80,6 +80,7 @@ struct XQueryWalkedStep {
   bool absorbsNext = false;
   bool countsBelow = false;
   bool filtersEach = false;
+  bool asksForWays = false;
   bool gathersFirst = false;
   // The predicate that is a number, the same for all nodes; noPredicate for none.
   static constexpr size_t noPredicate = SIZE_MAX;

@@ -56,6 +56,8 @@ void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryWalkedPath& p
   const auto& steps = path.steps();
   for (size_t i = 0; i < steps.size(); ++i) {
     if (steps[i].isExpression() || steps[i].testMayRaise) return;
+    // What asks for nothing but names above is asked of a whole way at once.
+    if (steps[i].asksForWays) continue;
     auto condition = conditionOf(planning, XQueryPredicatesOf(planning, place, steps[i]));
     if (condition.terms.empty()) continue;
     if (i + 1 < steps.size() && steps[i + 1].isExpression()) return;

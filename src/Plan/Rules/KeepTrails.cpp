@@ -11,6 +11,7 @@
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 #include "Plan/Rules/PathAt.h"
+#include "Plan/Rules/WayConditions.h"
 
 #include <algorithm>
 #include <string_view>
@@ -95,6 +96,7 @@ class Search {
       if (step.isExpression() || step.testMayRaise || !canRepeat(i)) break;
       loadsDocuments = loadsDocuments || _of[i].loads;
       step.filtersEach = step.hasPredicates() && _of[i].areOfTruth;
+      step.asksForWays = step.filtersEach && _of[i].areOfWays;
       if (step.isDescendantShorthand() && i + 1 < _steps.size()) {
         _steps[i + 1].countsBelow = i == 0 && startsFromOne() && mayCountBelow(i + 1);
         step.absorbsNext = _steps[i + 1].countsBelow || mayTakeDescendants(i + 1);
@@ -116,6 +118,7 @@ class Search {
     // documents.
     bool areOfTruth = true;
     bool areOfTruthBehind = true;  // the same but for the first one
+    bool areOfWays = true;
     bool loads = false;
     XQueryVariableSet reads;
   };
@@ -141,6 +144,7 @@ class Search {
                              !facts.mayBe(XQueryItems::Numeric | XQueryItems::Other);
       of.areOfTruth = of.areOfTruth && isOfTruth;
       if (i > step.predicatesInTest) of.areOfTruthBehind = of.areOfTruthBehind && isOfTruth;
+      of.areOfWays = of.areOfWays && XQueryIsOfWays(_planning.program, places[i]);
       of.reads.add(facts.reads);
       _assigned.add(facts.assigns);
     }

@@ -94,6 +94,30 @@ TEST(AlongWays, FindsWhatRandomPathsFind) {
   }
 }
 
+// Predicates that look at nothing but names above, and others beside them.
+TEST(AlongWays, AsksOncePerWayWhatLooksUpByNames) {
+  const Value trees[] = {records(120), records(90, true)};
+  const std::vector<std::string> tests = {
+      "ancestor::people", "parent::person", "ancestor::item/ancestor::items", "self::name",
+      "count(ancestor::item) > 1", "ancestor::item[1]", "ancestor::item[2]", "not(parent::friend)",
+      "exists(ancestor-or-self::item[parent::items])", "empty(ancestor::friend)",
+      "0 = count(parent::person)", "parent::person or parent::friend", "ancestor::none",
+      "ancestor::person and not(ancestor::friend)",
+      // These are asked of each.
+      "ancestor::person[note]", "ancestor::person/@n > 50", "parent::*", "..", "count(ancestor::*)",
+      "parent::person[last()]", "ancestor::person = 'x'", "following-sibling::name"};
+  for (const std::string& test : tests) {
+    for (const char* path : {"//name", "//item", "/site//name", "//person/name", "//*", "//note"}) {
+      const std::string filtered = std::string(path) + "[" + test + "]";
+      for (const Value& tree : trees) {
+        isSame("count(" + filtered + ")", tree);
+        isSame("exists(" + filtered + "), count(" + filtered + "/..)", tree);
+        isSame("count(" + filtered + ") > 100, " + filtered, tree);
+      }
+    }
+  }
+}
+
 // The context item need not be the document, and the document need not be as it was.
 TEST(AlongWays, StartAtTheDocument) {
   const Value tree = records(200);
@@ -116,7 +140,10 @@ TEST(AlongWays, LooksAtNoNodeThatIsOnlyCounted) {
         std::pair("count(/site/people/*/name)", "20000"),
         std::pair("count(/site/people//name)", "24000"),
         std::pair("exists(/site/people/person/friend)", "true"),
-        std::pair("count(/site/people/person/note) > 6000", "true")}) {
+        std::pair("count(/site/people/person/note) > 6000", "true"),
+        std::pair("count(//name[ancestor::friend])", "4000"),
+        std::pair("count(//name[count(ancestor::friend) > 0])", "4000"),
+        std::pair("count(//name[parent::person or parent::item])", "20001")}) {
     const auto query = compiled(text, XQueryWay::Planned);
     const auto context = XQueryContext::xqueryContext();
     context->_internal().setContextItem(tree, 1);
