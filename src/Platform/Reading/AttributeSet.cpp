@@ -12,7 +12,7 @@ void AttributeSet::start(size_t most) {
   if (_isTable) _places.assign(std::bit_ceil(2 * most), nullptr);
 }
 
-bool AttributeSet::insertIntoTable(const NSXMLExpandedName* name) {
+bool AttributeSet::insertIntoTable(const void* name) {
   const size_t mask = _places.size() - 1;
   size_t place = keyedHash(reinterpret_cast<uintptr_t>(name)) & mask;
   for (; _places[place]; place = (place + 1) & mask) {

@@ -5,6 +5,7 @@
 #pragma once
 
 #include "Platform/Reading/LibXML.h"
+#include "Platform/Reading/ProjectedElements.h"
 #include "Platform/Reading/ReadTree.h"
 
 #include <unordered_map>
@@ -33,11 +34,55 @@ class LibXMLNames {
   size_t _count = 0;
 };
 
+// The namespaces of one document, stored once for all declarations of one URI.
+class LibXMLURIs {
+ public:
+  // `goesBack`: the tree may, while it is read.
+  explicit LibXMLURIs(bool goesBack = false) : _goesBack(goesBack) {}
+  void addTo(ReadTree& tree, LibXMLNames& names, const LibXMLNamespaces& namespaces);
+
+ private:
+  const NSStringView* storedIn(ReadTree& tree, LibXMLText URI);
+
+  const bool _goesBack;
+  std::unordered_map<LibXMLText, const NSStringView*> _URIs;
+};
+
+// The same of a part of the document.
+class LibXMLProjectionHandler final : public LibXMLHandler {
+ public:
+  LibXMLProjectionHandler(ReadTree& tree, const XMLProjection& projection)
+      : _tree(tree), _names(tree.tree()), _projected(tree, projection) {}
+
+  void startElement(const LibXMLName& name, const LibXMLNamespaces& namespaces,
+                    const LibXMLAttributes& attributes) override;
+  void endElement() override {
+    if (_projected.close()) _tree.closeElement();
+  }
+  void characters(std::string_view text) override;
+  void CDATA(std::string_view text) override;
+  void comment(std::string_view text) override;
+  void processingInstruction(LibXMLText target, std::string_view text) override;
+
+ private:
+  using States = XMLProjectionStates;
+
+  void buildAbove();
+  // Of a local name, which has one address for all of the document.
+  States::NameID selected(LibXMLText localName);
+
+  ReadTree& _tree;
+  LibXMLNames _names;
+  LibXMLURIs _URIs;
+  ProjectedElements<LibXMLName> _projected;
+  std::unordered_map<LibXMLText, States::NameID> _selected;
+};
+
 class LibXMLTreeHandler final : public LibXMLHandler {
  public:
   // `goesBack`: the tree may, while it is read.
   explicit LibXMLTreeHandler(ReadTree& tree, bool goesBack = false)
-      : _tree(tree), _goesBack(goesBack), _names(tree.tree()) {}
+      : _tree(tree), _names(tree.tree()), _URIs(goesBack) {}
 
   void startElement(const LibXMLName& name, const LibXMLNamespaces& namespaces,
                     const LibXMLAttributes& attributes) override;
@@ -50,13 +95,9 @@ class LibXMLTreeHandler final : public LibXMLHandler {
   }
 
  private:
-  // In the tree, once for all declarations of one URI.
-  const NSStringView* storedURI(LibXMLText URI);
-
   ReadTree& _tree;
-  const bool _goesBack;
   LibXMLNames _names;
-  std::unordered_map<LibXMLText, const NSStringView*> _URIs;
+  LibXMLURIs _URIs;
 };
 
 }  // namespace xquery

@@ -143,6 +143,10 @@ ReadName* ReadNames::add(std::string_view bytes, uint64_t hash, const uint64_t (
   name->head[1] = head[1];
   name->bytes = _memory.copy(bytes);
   name->hasPrefix = shape.colon != 0;
+  name->isOfXML = bytes.starts_with("xml:");
+  if (_selection) {
+    name->selected = _selection(name->hasPrefix ? bytes.substr(shape.colon + 1) : bytes);
+  }
   name->prefix = name->hasPrefix ? prefixOf(bytes.substr(0, shape.colon)) : _noPrefix;
   if (bytes == "xmlns") {
     name->declares = _noPrefix;
@@ -207,12 +211,16 @@ const NSXMLName* ReadNames::resolve(ReadName& name, const ReadNamespace* URI,
   return found->name;
 }
 
-const NSXMLName* ReadNames::target(std::string_view bytes) {
+ReadName* ReadNames::targetEntry(std::string_view bytes) {
   take(!bytes.empty() && bytes.size() <= longestNameTaken);
   ReadName* const name =
       find(bytes.data(), bytes.data() + bytes.size(), bytes.data() + bytes.size());
   take(!name->hasPrefix);
-  return attributeName(*name);
+  return name;
+}
+
+const NSXMLName* ReadNames::target(std::string_view bytes) {
+  return attributeName(*targetEntry(bytes));
 }
 
 // --- declarations ----------------------------------------------------------------------------

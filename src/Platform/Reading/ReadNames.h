@@ -9,6 +9,7 @@
 #pragma once
 
 #include "Platform/Reading/EntryTable.h"
+#include "Platform/Reading/NotTaken.h"
 #include "Platform/Tree/Names.h"
 
 #include <functional>
@@ -42,6 +43,8 @@ struct ReadName {
   std::string_view bytes;
   ReadPrefix* prefix = nullptr;  // the empty one if there is none
   bool hasPrefix = false;
+  bool isOfXML = false;            // its prefix is "xml"
+  uint32_t selected = 0;           // what the selection says of its local name
   ReadPrefix* declares = nullptr;  // as an attribute
   Interned element;                // as what it was interned last
   Interned attribute;
@@ -52,6 +55,10 @@ class ReadNames {
  public:
   // Names are counted by the tree.
   explicit ReadNames(NSXMLTree& tree);
+
+  // Asked once of each local name that is met.
+  using Selection = std::function<uint32_t(std::string_view localName)>;
+  void select(Selection selection) { _selection = std::move(selection); }
 
   // These throw NotTaken for what is no name, or not one that can stand there.
   //
@@ -64,6 +71,16 @@ class ReadNames {
   const NSXMLName* elementName(ReadName& name);
   const NSXMLName* attributeName(ReadName& name);
   const NSXMLName* target(std::string_view bytes);  // of an instruction
+
+  // The same of what is not put into the tree: only that it can stand there.
+  static void checkElementName(const ReadName& name) {
+    take(name.prefix->bound || !name.hasPrefix);
+  }
+  void checkTarget(std::string_view bytes) { static_cast<void>(targetEntry(bytes)); }
+  // An element's name with the namespace that its prefix was bound to where it was read.
+  const NSXMLName* elementName(ReadName& name, const ReadNamespace* boundThere) {
+    return resolve(name, boundThere, name.element);
+  }
 
   // What an element declares: from here on, until `endElement` for the same depth. `store` puts the
   // text of a new namespace into the tree. Answers that text, null for no namespace.
@@ -89,6 +106,7 @@ class ReadNames {
     const ReadNamespace* before;
   };
 
+  ReadName* targetEntry(std::string_view bytes);
   ReadName* add(std::string_view bytes, uint64_t hash, const uint64_t (&head)[2]);
   ReadPrefix* prefixOf(std::string_view bytes);
   ReadNamespace* namespaceOf(std::string_view URI, const Store& store);
@@ -104,6 +122,7 @@ class ReadNames {
   EntryTable<Resolved> _resolved;
   std::vector<Binding, ValueAllocator<Binding>> _bindings;
   uint64_t _tag = 0;
+  Selection _selection;
   ReadName _none;
   ReadName* _last = &_none;  // that was found
   ReadPrefix* const _noPrefix;

@@ -45,6 +45,8 @@ class ReadTree {
   void addSection(std::string_view text);
   void addComment(const ReadText& text);
   void addInstruction(const NSXMLName* target, const ReadText& text);
+  // Something follows that ends a run of text, whether or not it is put into the tree.
+  void endText() { flush(); }
   // Throws for what is none at once, not when it is put into the tree.
   void check(const ReadText& text);
   // For nodes to share.

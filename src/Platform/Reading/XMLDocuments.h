@@ -13,9 +13,24 @@ enum class XMLWay : uint8_t {
   LibXML,  // libxml2's alone
 };
 
-// The document; null, with the error, where it is not well formed.
+class XMLProjection;
+
+// The document; null, with the error, where it is not well formed. With a projection only what that
+// needs is made, and the whole text read and refused as ever.
 [[nodiscard]] Ref<NSXMLDocument> readDocument(TextSource& source, uint32_t options,
-                                              NSXMLParseError& error, XMLWay way = XMLWay::Either);
+                                              NSXMLParseError& error, XMLWay way = XMLWay::Either,
+                                              const XMLProjection* projection = nullptr);
+
+// NSXMLDocument::documentWithData and documentWithFile, of what the projection needs. HTML is read
+// as a whole.
+[[nodiscard]] Ref<NSXMLDocument> projectedDocumentWithData(std::string_view bytes, uint32_t options,
+                                                           const XMLProjection* projection,
+                                                           NSXMLParseError& error);
+[[nodiscard]] Ref<NSXMLDocument> projectedDocumentWithFile(const std::string& path,
+                                                           uint32_t options,
+                                                           const XMLProjection* projection,
+                                                           NSXMLParseError& error,
+                                                           const NSXMLReadingProgress& progress);
 
 // NSXMLDocument::documentWithData, where packed text may be so long and no longer.
 [[nodiscard]] Ref<NSXMLDocument> documentWithBoundedData(std::string_view bytes, uint32_t options,
@@ -24,6 +39,7 @@ enum class XMLWay : uint8_t {
 
 // libxml2's way.
 [[nodiscard]] Ref<NSXMLDocument> readWithLibXML(const TextInput& input, uint32_t options,
-                                                size_t expectedBytes, NSXMLParseError& error);
+                                                size_t expectedBytes, NSXMLParseError& error,
+                                                const XMLProjection* projection = nullptr);
 
 }  // namespace xquery

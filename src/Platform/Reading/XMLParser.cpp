@@ -40,13 +40,14 @@ std::optional<ValueText<char>> readAll(const TextInput& read) {
 }
 
 // Null as well where the packed bytes turn out to be bad, whatever has been read of them.
-Ref<NSXMLDocument> readUnpacked(UnpackedInput& input, uint32_t options, NSXMLParseError& error) {
+Ref<NSXMLDocument> readUnpacked(UnpackedInput& input, uint32_t options,
+                                const XMLProjection* projection, NSXMLParseError& error) {
   Ref<NSXMLDocument> document;
   if (options & NSXMLDocumentTidyHTML) {
     if (const auto bytes = readAll(input.input())) document = parseHTML(*bytes, options, error);
   } else {
     TextSource source(input.input(), input.rewinding());
-    document = readDocument(source, options, error);
+    document = readDocument(source, options, error, XMLWay::Either, projection);
   }
   if (input.failure().empty()) return document;
   error = {input.failure(), 0, 0};
@@ -59,19 +60,8 @@ Ref<NSXMLDocument> unreadable(const std::string& path, const std::string& failur
   return nullptr;
 }
 
-}  // namespace
-
-Ref<NSXMLDocument> readDocument(TextSource& source, uint32_t options, NSXMLParseError& error,
-                                XMLWay way) {
-  if (way != XMLWay::LibXML) {
-    Ref<NSXMLDocument> document = readXML(source, options);
-    if (document || way == XMLWay::Own) return document;
-  }
-  return readWithLibXML(source.fromTheBeginning(), options, source.expectedBytes(), error);
-}
-
-Ref<NSXMLDocument> documentWithBoundedData(std::string_view bytes, uint32_t options,
-                                           uint64_t mostBytes, NSXMLParseError& error) {
+Ref<NSXMLDocument> documentWithBytes(std::string_view bytes, uint32_t options, uint64_t mostBytes,
+                                     const XMLProjection* projection, NSXMLParseError& error) {
   if (packingOf(bytes)) {
     TextSource packed(bytes);
     TextInput input = packed.fromTheBeginning();
@@ -81,11 +71,34 @@ Ref<NSXMLDocument> documentWithBoundedData(std::string_view bytes, uint32_t opti
     };
     UnpackedInput unpacked([&](char* buffer, size_t size) { return input(buffer, size); }, rewind,
                            mostBytes);
-    return readUnpacked(unpacked, options, error);
+    return readUnpacked(unpacked, options, projection, error);
   }
   if (options & NSXMLDocumentTidyHTML) return parseHTML(bytes, options, error);
   TextSource source(bytes);
-  return readDocument(source, options, error);
+  return readDocument(source, options, error, XMLWay::Either, projection);
+}
+
+}  // namespace
+
+Ref<NSXMLDocument> readDocument(TextSource& source, uint32_t options, NSXMLParseError& error,
+                                XMLWay way, const XMLProjection* projection) {
+  if (way != XMLWay::LibXML) {
+    Ref<NSXMLDocument> document = readXML(source, options, projection);
+    if (document || way == XMLWay::Own) return document;
+  }
+  return readWithLibXML(source.fromTheBeginning(), options, source.expectedBytes(), error,
+                        projection);
+}
+
+Ref<NSXMLDocument> documentWithBoundedData(std::string_view bytes, uint32_t options,
+                                           uint64_t mostBytes, NSXMLParseError& error) {
+  return documentWithBytes(bytes, options, mostBytes, nullptr, error);
+}
+
+Ref<NSXMLDocument> projectedDocumentWithData(std::string_view bytes, uint32_t options,
+                                             const XMLProjection* projection,
+                                             NSXMLParseError& error) {
+  return documentWithBytes(bytes, options, std::numeric_limits<uint64_t>::max(), projection, error);
 }
 
 Ref<NSXMLDocument> NSXMLDocument::documentWithData(std::string_view bytes, uint32_t options,
@@ -99,16 +112,22 @@ Ref<NSXMLDocument> NSXMLDocument::documentWithFile(const std::string& path, uint
                                                    NSXMLParseError* error,
                                                    const NSXMLReadingProgress& progress) {
   NSXMLParseError ignored;
-  NSXMLParseError& reported = error ? *error : ignored;
+  return projectedDocumentWithFile(path, options, nullptr, error ? *error : ignored, progress);
+}
+
+Ref<NSXMLDocument> projectedDocumentWithFile(const std::string& path, uint32_t options,
+                                             const XMLProjection* projection,
+                                             NSXMLParseError& error,
+                                             const NSXMLReadingProgress& progress) {
   InputFile file(path);
-  if (!file.isOpen()) return unreadable(path, std::strerror(file.failure()), reported);
+  if (!file.isOpen()) return unreadable(path, std::strerror(file.failure()), error);
   UnpackedInput input([&](char* buffer, size_t size) { return file.read(buffer, size, progress); },
                       file.isSeekable() ? [&] { return file.rewind(); } : TextRewinding());
-  Ref<NSXMLDocument> document = readUnpacked(input, options, reported);
+  Ref<NSXMLDocument> document = readUnpacked(input, options, projection, error);
   if (file.failure()) {
-    return unreadable(path, std::strerror(file.failure()), reported);
+    return unreadable(path, std::strerror(file.failure()), error);
   }
-  if (!input.failure().empty()) return unreadable(path, input.failure(), reported);
+  if (!input.failure().empty()) return unreadable(path, input.failure(), error);
   return document;
 }
 

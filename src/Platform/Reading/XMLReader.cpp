@@ -9,6 +9,7 @@
 #include "Platform/Reading/LibXML.h"
 #include "Platform/Reading/MarkedText.h"
 #include "Platform/Reading/NotTaken.h"
+#include "Platform/Reading/ProjectedElements.h"
 #include "Platform/Reading/ReadNames.h"
 #include "Platform/Reading/ReadTree.h"
 #include "Platform/Reading/References.h"
@@ -21,6 +22,7 @@
 #include <algorithm>
 #include <cstring>
 #include <new>
+#include <optional>
 #include <utility>
 
 namespace xquery {
@@ -40,6 +42,12 @@ class XMLReader {
  public:
   XMLReader(TextSource& source, uint32_t options)
       : _source(source), _tree(options, source.expectedBytes()), _names(_tree.tree()) {}
+  // Of the document only that is made; it outlives the reader.
+  XMLReader(TextSource& source, uint32_t options, const XMLProjection& projection)
+      : _source(source), _tree(options, bytesBeforeAny), _names(_tree.tree()) {
+    _projected.emplace(_tree, projection);
+    _names.select([this](std::string_view name) { return _projected->nameOf(name); });
+  }
   NSXMLDocument* read();
 
   // --- piece by piece --------------------------------------------------------------------------
@@ -76,6 +84,13 @@ class XMLReader {
     const NSStringView* URI = nullptr;  // that it declares, in the tree; null for none
   };
 
+  // What an element is known by that waits for something below it to be put into the tree.
+  struct Waiting {
+    ReadName* name;
+    const ReadNamespace* URI;
+  };
+  using Projected = ProjectedElements<Waiting>;
+
   void start();
   bool getMore();
   const char* readPiece(const char* at);
@@ -87,6 +102,7 @@ class XMLReader {
   const char* readText(const char* at);
   bool isFollowedBySection(const char* at) const;
   void addText(const Raw& text, bool isWhole);
+  ReadText knownText(const Raw& text);
 
   ReadName* readName(const char*& at);
   const char* readStartTag(const char* at);
@@ -99,6 +115,12 @@ class XMLReader {
   void declareNamespaces();
   void addNamespaces();
   void addAttributes();
+  void openProjected(ReadName& name);
+  void buildAbove();
+  bool hasNeededAttribute(const Projected::States::State& state) const;
+  void addNeededAttributes(const Projected::States::State& state);
+  void checkTag(const ReadName& name);
+  void checkDistinct();
   ReadText valueOf(const Raw& value);
   const char* readEndTag(const char* at);
 
@@ -119,10 +141,14 @@ class XMLReader {
   AttributeSet _distinct;
   ValueText<char> _scratch;
   bool _declares = false;  // the tag that is being read
+  bool _hasScope = false;  // it does, or has attributes of XML's own
   bool _isASCII = false;   // as declared
   bool _hasBegun = false;
   bool _hasType = false;
   bool _hasRoot = false;
+
+  static constexpr size_t bytesBeforeAny = size_t{1} << 14;
+  std::optional<Projected> _projected;
 
   bool _isByPieces = false;
   const char* _pieceStart = nullptr;  // of the last one
@@ -261,12 +287,19 @@ bool XMLReader::isFollowedBySection(const char* at) const {
   return at[1] == '!';
 }
 
+ReadText XMLReader::knownText(const Raw& text) {
+  const ReadText known = textOf(text.bytes(), text.wide);
+  if (text.isPlain) return known;
+  _scratch.clear();
+  appendTextOf(known.bytes, _scratch);
+  return ReadText(_scratch);
+}
+
 void XMLReader::addText(const Raw& text, bool isWhole) {
-  ReadText known = textOf(text.bytes(), text.wide);
-  if (!text.isPlain) {
-    _scratch.clear();
-    appendTextOf(known.bytes, _scratch);
-    known = ReadText(_scratch);
+  const ReadText known = knownText(text);
+  if (_projected) {
+    if (!_projected->needsTexts()) return _tree.check(known);
+    buildAbove();
   }
   if (isWhole && !_tree.hasText()) {
     _tree.addWholeText(known);
@@ -301,7 +334,7 @@ const char* XMLReader::readStartTag(const char* at) {
   ReadName* const name = readName(++at);
   if (!name) return nullptr;
   _attributes.clear();
-  _declares = false;
+  _declares = _hasScope = false;
   for (;;) {
     const char* const next = skipSpace(at);
     if (next == _end) return nullptr;
@@ -339,6 +372,7 @@ const char* XMLReader::readAttribute(const char* at) {
   at = readValue(at + 1, *at, attribute.value);
   if (!at) return nullptr;
   if (attribute.name->declares) _declares = true;
+  if (attribute.name->declares || attribute.name->isOfXML) _hasScope = true;
   _attributes.push_back(attribute);
   return at;
 }
@@ -382,6 +416,7 @@ void XMLReader::openElement(ReadName& name) {
   if (_declares) declareNamespaces();
   _open.push_back(&name);
   _hasRoot = true;
+  if (_projected) return openProjected(name);
   _tree.openElement(_names.elementName(name));
   if (_declares) addNamespaces();
   if (!_attributes.empty()) addAttributes();
@@ -405,9 +440,79 @@ void XMLReader::addAttributes() {
 }
 
 void XMLReader::closeElement() {
-  _tree.closeElement();
+  if (!_projected || _projected->close()) _tree.closeElement();
   _open.pop_back();
   _names.endElement(_open.size());
+}
+
+// --- what is projected -----------------------------------------------------------------------
+
+void XMLReader::buildAbove() {
+  _projected->buildAbove(
+      [this](const Waiting& each) { _tree.openElement(_names.elementName(*each.name, each.URI)); });
+}
+
+void XMLReader::openProjected(ReadName& name) {
+  ReadNames::checkElementName(name);
+  const auto build = [this](const Waiting& each) {
+    _tree.openElement(_names.elementName(*each.name, each.URI));
+  };
+  const auto isNeeded = [this](const Projected::States::State& state) {
+    return _hasScope || (state.needsAnyAttribute() && hasNeededAttribute(state));
+  };
+  if (!_projected->open(name.selected, {&name, name.prefix->bound}, isNeeded, build)) {
+    return checkTag(name);
+  }
+  _tree.openElement(_names.elementName(name));
+  if (_declares) addNamespaces();
+  if (!_attributes.empty()) addNeededAttributes(_projected->state());
+}
+
+bool XMLReader::hasNeededAttribute(const Projected::States::State& state) const {
+  return std::any_of(_attributes.begin(), _attributes.end(), [&](const Attribute& each) {
+    return !each.name->declares && state.needsAttribute(each.name->selected);
+  });
+}
+
+void XMLReader::addNeededAttributes(const Projected::States::State& state) {
+  checkDistinct();
+  for (const Attribute& attribute : _attributes) {
+    if (attribute.name->declares) continue;
+    const ReadText value = valueOf(attribute.value);
+    if (attribute.name->isOfXML || state.needsAttribute(attribute.name->selected)) {
+      _tree.addAttribute(_names.attributeName(*attribute.name), value);
+    } else {
+      _tree.check(value);
+    }
+  }
+}
+
+void XMLReader::checkTag(const ReadName& name) {
+  ReadNames::checkElementName(name);
+  if (_attributes.empty()) return;
+  checkDistinct();
+  for (const Attribute& attribute : _attributes) {
+    if (!attribute.name->declares) _tree.check(valueOf(attribute.value));
+  }
+}
+
+// Names without a prefix are distinct as they are written.
+void XMLReader::checkDistinct() {
+  bool hasPrefixes = false;
+  for (const Attribute& attribute : _attributes) {
+    if (attribute.name->declares || !attribute.name->hasPrefix) continue;
+    hasPrefixes = true;
+    take(attribute.name->prefix->bound != nullptr);
+  }
+  if (_attributes.size() < 2) return;
+  _distinct.start(_attributes.size());
+  for (const Attribute& attribute : _attributes) {
+    if (attribute.name->declares) continue;
+    const void* const key =
+        hasPrefixes ? static_cast<const void*>(_names.attributeName(*attribute.name)->expanded)
+                    : attribute.name;
+    take(_distinct.insert(key));
+  }
 }
 
 const char* XMLReader::readEndTag(const char* at) {
@@ -446,7 +551,13 @@ const char* XMLReader::readComment(const char* at) {
     if (at[1] == '-') break;
   }
   take(at[2] == '>');
-  _tree.addComment(linesOf({begin, at}));
+  const ReadText text = linesOf({begin, at});
+  if (!_projected || _projected->needsComments()) {
+    _tree.addComment(text);
+  } else {
+    _tree.endText();
+    _tree.check(text);
+  }
   return at + 3;
 }
 
@@ -459,6 +570,13 @@ const char* XMLReader::readSection(const char* at) {
     if (at[1] == ']' && at[2] == '>') break;
   }
   const ReadText text = linesOf({begin, at});
+  if (_projected) {
+    if (!_projected->needsTexts()) {
+      _tree.check(text);
+      return at + 3;
+    }
+    buildAbove();
+  }
   if (_isByPieces) _tree.check(text);
   _tree.addSection(text.bytes);
   return at + 3;
@@ -483,7 +601,14 @@ const char* XMLReader::readInstruction(const char* at) {
     if (at[1] == '>') break;
   }
   static_cast<void>(textOf(target, !isASCII(target)));
-  _tree.addInstruction(_names.target(target), linesOf({begin, at}));
+  if (!_projected || _projected->needsInstructions()) {
+    if (_projected) buildAbove();
+    _tree.addInstruction(_names.target(target), linesOf({begin, at}));
+  } else {
+    _tree.endText();
+    _names.checkTarget(target);
+    _tree.check(linesOf({begin, at}));
+  }
   return at + 2;
 }
 
@@ -491,8 +616,9 @@ const char* XMLReader::readInstruction(const char* at) {
 
 // --- the doors -------------------------------------------------------------------------------
 
-Ref<NSXMLDocument> readXML(TextSource& source, uint32_t options) {
+Ref<NSXMLDocument> readXML(TextSource& source, uint32_t options, const XMLProjection* projection) {
   try {
+    if (projection) return Ref<NSXMLDocument>(XMLReader(source, options, *projection).read());
     return Ref<NSXMLDocument>(XMLReader(source, options).read());
   } catch (const NotTaken&) {
   } catch (const LibXMLStop&) {

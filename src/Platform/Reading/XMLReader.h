@@ -12,7 +12,11 @@
 
 namespace xquery {
 
-// The document; null where this reader does not take the text. `options` are NSXMLOptions.
-[[nodiscard]] Ref<NSXMLDocument> readXML(TextSource& source, uint32_t options);
+class XMLProjection;
+
+// The document, or what the projection needs of it; null where this reader does not take the text.
+// `options` are NSXMLOptions.
+[[nodiscard]] Ref<NSXMLDocument> readXML(TextSource& source, uint32_t options,
+                                         const XMLProjection* projection = nullptr);
 
 }  // namespace xquery

@@ -8,8 +8,8 @@ namespace xquery {
 namespace {
 
 // Names are compared by their addresses only.
-const NSXMLExpandedName* name(size_t index) {
-  return reinterpret_cast<const NSXMLExpandedName*>(0x1000 + index * 64);
+const void* name(size_t index) {
+  return reinterpret_cast<const void*>(0x1000 + index * 64);
 }
 
 TEST(AttributeSet, HoldsEachNameOnce) {
