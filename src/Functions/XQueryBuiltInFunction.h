@@ -54,6 +54,13 @@ class XQueryBuiltInFunction : public NSCounted {
     // Of what it hands on of its first argument: items stay in their order; none is left out.
     KeepsOrder = 1 << 11,
     KeepsCount = 1 << 12,
+    // Of nodes among its arguments, or that are the context item, it looks at nothing but: what
+    // atomizing them gives, and hands on none of the first argument's; their kinds and names; how
+    // many the first argument has, and the values of the others. Of a function that has none of
+    // these it is not known.
+    LooksAtValues = 1 << 13,
+    LooksAtNames = 1 << 14,
+    LooksAtCount = 1 << 15,
   };
 
   // Kinds of an answer besides the plain ones: those of the first argument, of all arguments, and
