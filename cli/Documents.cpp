@@ -8,6 +8,7 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
+#include <functional>
 #include <memory>
 #include <optional>
 
@@ -106,17 +107,48 @@ NSXMLReadingProgress DocumentProgress::callback() {
   return [this](uint64_t bytes, uint64_t whole) { _line->show(bytes, whole); };
 }
 
-Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path, Markup markup) {
+namespace {
+
+using Reader = std::function<Ref<NSXMLDocument>(uint32_t mode, NSXMLParseError* error,
+                                                const NSXMLReadingProgress& progress)>;
+
+Ref<NSXMLDocument> readWith(const Reader& reader, const Options& options, const std::string& path,
+                            Markup markup) {
   NSXMLParseError error;
   uint32_t mode = readingMode(options);
   if (markup == Markup::HTML) mode |= NSXMLDocumentTidyHTML;
   Ref<NSXMLDocument> document;
   {
     DocumentProgress progress(options, path);
-    document = NSXMLDocument::documentWithFile(path, mode, &error, progress.callback());
+    document = reader(mode, &error, progress.callback());
   }
   if (!document) throw readingFailure(path, error);
   return document;
+}
+
+// JSON has the places of nodes, which are counted among those beside them.
+bool showsSurroundings(const Options& options, const XQuery& query) {
+  return options.format == Format::JSON && XQueryProjectionOf(query).answersNodes;
+}
+
+}  // namespace
+
+Ref<NSXMLDocument> readDocument(const Options& options, const std::string& path, Markup markup) {
+  const auto reader = [&](uint32_t mode, NSXMLParseError* error,
+                          const NSXMLReadingProgress& progress) {
+    return NSXMLDocument::documentWithFile(path, mode, error, progress);
+  };
+  return readWith(reader, options, path, markup);
+}
+
+Ref<NSXMLDocument> readInput(const Options& options, const std::string& path, const XQuery& query) {
+  const Markup markup = options.html ? Markup::HTML : Markup::XML;
+  if (showsSurroundings(options, query)) return readDocument(options, path, markup);
+  const auto reader = [&](uint32_t mode, NSXMLParseError* error,
+                          const NSXMLReadingProgress& progress) {
+    return XQueryProjectedDocumentWithFile(query, path, mode, error, progress);
+  };
+  return readWith(reader, options, path, markup);
 }
 
 XQueryConstants bindConstants(const Options& options) {

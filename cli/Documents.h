@@ -31,6 +31,9 @@ enum class Markup { XML, HTML };
 // "-" is standard input. Throws Failure.
 xquery::Ref<xquery::NSXMLDocument> readDocument(const Options& options, const std::string& path,
                                                 Markup markup);
+// The same, of what the query needs of an input for results as the options write them.
+xquery::Ref<xquery::NSXMLDocument> readInput(const Options& options, const std::string& path,
+                                             const xquery::XQuery& query);
 
 // How a document is to be read, and what there is to say of one that could not be.
 uint32_t readingMode(const Options& options);

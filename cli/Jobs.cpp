@@ -138,7 +138,7 @@ Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) const {
   if (input) refuseOutputAsInput(_options, input->path);
   const Value contextItem = phases.parse.measure([&]() -> Value {
     if (!input) return nullptr;
-    return readDocument(_options, input->path, _options.html ? Markup::HTML : Markup::XML);
+    return readInput(_options, input->path, _query);
   });
   Ref<NSArray> items = evaluated(contextItem, phases);
   if (interruption()->load()) throw Failure{};

@@ -11,6 +11,7 @@
 #include "xquery/Number.h"
 #include "xquery/Object.h"
 #include "xquery/Profile.h"
+#include "xquery/Projection.h"
 #include "xquery/Serializing.h"
 #include "xquery/Stream.h"
 #include "xquery/String.h"

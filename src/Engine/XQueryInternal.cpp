@@ -55,12 +55,16 @@ void XQueryInternal::plan(XQueryWay way) {
   } else if (way == XQueryWay::Explained) {
     _warnings = XQueryCheckedProgram(*_prolog, _body);
     auto report = std::make_unique<XQueryPlanReport>();
-    _body = XQueryPlanned(*_prolog, _body, *report);
+    auto projection = std::make_unique<XQueryProjectionPlan>();
+    _body = XQueryPlanned(*_prolog, _body, *projection, *report);
     _planReport = std::move(report);
+    _projectionPlan = std::move(projection);
   } else if (way == XQueryWay::Profiled) {
     planToProfile();
   } else if (way == XQueryWay::Planned && XQueryPlanIsEnabled()) {
-    _body = XQueryPlanned(*_prolog, _body);
+    auto projection = std::make_unique<XQueryProjectionPlan>();
+    _body = XQueryPlanned(*_prolog, _body, *projection);
+    _projectionPlan = std::move(projection);
   }
 }
 

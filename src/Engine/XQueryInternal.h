@@ -17,6 +17,7 @@ namespace xquery {
 
 class XQueryPlanReport;
 struct XQueryProfiledProgram;
+struct XQueryProjectionPlan;
 class XQueryProlog;
 
 class XQueryInternal {
@@ -38,6 +39,8 @@ class XQueryInternal {
   const XQueryPlanReport* planReport() const { return _planReport.get(); }
   // Of a query that was compiled to be explained, in the order of its text.
   const std::vector<XQueryWarning>& warnings() const { return _warnings; }
+  // Of a query that was planned, and without errors; else null.
+  const XQueryProjectionPlan* projectionPlan() const { return _projectionPlan.get(); }
   // Of a query that was compiled to be streamed, and without errors; else null.
   const XQueryStreamProgram* streamProgram() const { return _streamProgram.get(); }
   // Of a query that was compiled to be profiled, and without errors; else null.
@@ -57,6 +60,7 @@ class XQueryInternal {
   std::vector<Ref<XQueryError>> _errors;
   std::unique_ptr<const XQueryPlanReport> _planReport;
   std::vector<XQueryWarning> _warnings;
+  std::unique_ptr<const XQueryProjectionPlan> _projectionPlan;
   std::unique_ptr<const XQueryStreamProgram> _streamProgram;
   std::shared_ptr<const XQueryProfiledProgram> _profiledProgram;
 };

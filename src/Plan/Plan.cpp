@@ -36,12 +36,26 @@ Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>&
 }
 
 Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
-                              XQueryPlanReport& report) {
+                              XQueryProjectionPlan& projection) {
+  XQueryProgram program(prolog, body);
+  if (program.placeCount() < 2) {
+    projection = XQueryPlanProjection(program, XQueryFactTable(program));
+    return body;
+  }
+  XQueryPlanning planning(program);
+  projection = XQueryPlanProjection(program, planning.facts);
+  applyRules(planning, XQueryRules(), nullptr);
+  return program.install();
+}
+
+Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
+                              XQueryProjectionPlan& projection, XQueryPlanReport& report) {
   XQueryProgram program(prolog, body);
   XQueryPlanning planning(program);
+  projection = XQueryPlanProjection(program, planning.facts);
   std::vector<XQueryPlanNote> notes;
   applyRules(planning, XQueryRules(), &notes);
-  report = XQueryPlanReport(planning, std::move(notes));
+  report = XQueryPlanReport(planning, std::move(notes), projection);
   return program.install();
 }
 

@@ -10,6 +10,7 @@
 #pragma once
 
 #include "Expr/XQueryExpr.h"
+#include "Plan/Projection/XQueryProjectionPlan.h"
 #include "Plan/Report.h"
 #include "Plan/Rules.h"
 
@@ -29,9 +30,12 @@ bool XQueryPlanIsEnabled();
 // planned body.
 Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
                               std::span<const XQueryRule> rules = XQueryRules());
+// The same, with what the program needs of its document.
+Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
+                              XQueryProjectionPlan& projection);
 // The same, and what there is to say of it.
 Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
-                              XQueryPlanReport& report);
+                              XQueryProjectionPlan& projection, XQueryPlanReport& report);
 // The same, or where queries are not planned the program as it is written, with expressions that
 // count in it; and what there is to say of these.
 Ref<XQueryExpr> XQueryProfiled(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,

@@ -3,6 +3,7 @@
 #include "Expr/XQueryLists.h"
 #include "Plan/Labels.h"
 #include "Plan/Planning.h"
+#include "Plan/Projection/XQueryProjectionPlan.h"
 #include "Plan/Rules.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryDeclarations.h"
@@ -181,8 +182,30 @@ std::string labelLine(std::string_view text) {
 }  // namespace
 
 XQueryPlanReport::XQueryPlanReport(const XQueryPlanning& planning,
-                                   std::vector<XQueryPlanNote> notes)
-    : _entries(Listing(planning, std::move(notes)).entries()) {}
+                                   std::vector<XQueryPlanNote> notes,
+                                   const XQueryProjectionPlan& projection)
+    : _entries(Listing(planning, std::move(notes)).entries()) {
+  addInput(planning, projection);
+}
+
+void XQueryPlanReport::addInput(const XQueryPlanning& planning,
+                                const XQueryProjectionPlan& projection) {
+  constexpr std::string_view rule = "projection";
+  if (!projection.isPossible()) {
+    const XQueryExpr& expr = *planning.program[projection.refusedAt].expr;
+    _entries.push_back({0,
+                        {},
+                        "input",
+                        expr.exprLine() + 1,
+                        "all of it, for " + XQueryLabelOf(expr),
+                        {},
+                        {{rule, projection.reason, true}}});
+  } else if (projection.isUsed) {
+    std::string paths = projection.projection.description();
+    if (paths.empty()) paths = "the document element";
+    _entries.push_back({0, {}, "input", 0, std::move(paths), {}, {}});
+  }
+}
 
 std::string XQueryPlanReport::text() const {
   // A query may nest as deep as memory goes.

@@ -12,6 +12,7 @@ namespace xquery {
 
 class XQueryPlanning;
 struct XQueryPlanNote;
+struct XQueryProjectionPlan;
 
 class XQueryPlanReport {
  public:
@@ -34,9 +35,10 @@ class XQueryPlanReport {
 
   XQueryPlanReport() = default;
   // The rules have been applied.
-  XQueryPlanReport(const XQueryPlanning& planning, std::vector<XQueryPlanNote> notes);
+  XQueryPlanReport(const XQueryPlanning& planning, std::vector<XQueryPlanNote> notes,
+                   const XQueryProjectionPlan& projection);
 
-  // Wholes before their parts.
+  // Wholes before their parts; last, what is read of the document, if anything looks at it.
   const std::vector<Entry>& entries() const { return _entries; }
 
   // UTF-8. One line for each entry, indented by its depth, and below it "+" with what was done and
@@ -49,6 +51,8 @@ class XQueryPlanReport {
   std::string DOT() const;
 
  private:
+  void addInput(const XQueryPlanning& planning, const XQueryProjectionPlan& projection);
+
   std::vector<Entry> _entries;
 };
 

@@ -1,5 +1,6 @@
-// Runs the whole-query cases under tests/queries/cases, each of them plain, planned and
-// profiled, and record by record where that can be done. A file holds any number of cases:
+// Runs the whole-query cases under tests/queries/cases, each of them plain, planned and profiled,
+// over a document of which only that is read what the query needs, and record by record where that
+// can be done. A file holds any number of cases:
 //
 //   == what the case shows
 //   -- var n=5                      (optional, repeatable: an untyped atomic external variable)
@@ -185,25 +186,30 @@ class QueryCase : public testing::Test {
       SCOPED_TRACE(name);
       run(way);
     }
+    SCOPED_TRACE("projected");
+    run(XQueryWay::Planned, true);
   }
 
  private:
-  void run(XQueryWay way) {
+  // `isProjected`: of the document only that is read what the query needs.
+  void run(XQueryWay way, bool isProjected = false) {
     const TestFolder folder;
     for (const auto& [name, text] : _case.files) folder.write(name, text);
     constexpr std::string_view place = "@folder@";
     const std::string URL = folder.URL("");
     const std::string text = replaced(_case.query, place, URL);
-    Value document;
-    if (!_case.xml.empty()) {
-      NSXMLParseError failure;
-      document = NSXMLDocument::documentWithData(_case.xml, NSXMLNodePreserveWhitespace, &failure);
-      ASSERT_TRUE(document) << failure.message;
-    }
     // The last line break belongs to the file, not to the query.
     const auto query = XQuery::xqueryWithSource(
         std::string_view(text).substr(0, text.empty() ? 0 : text.size() - 1), compileLoading(_case),
         XQueryLimits(), way);
+    Value document;
+    if (!_case.xml.empty()) {
+      NSXMLParseError failure;
+      constexpr uint32_t options = NSXMLNodePreserveWhitespace;
+      document = isProjected ? XQueryProjectedDocumentWithData(*query, _case.xml, options, &failure)
+                             : NSXMLDocument::documentWithData(_case.xml, options, &failure);
+      ASSERT_TRUE(document) << failure.message;
+    }
     const auto context = XQueryContext::xqueryContextWithNamespaces(_case.namespaces);
     Ref<XQueryError> error;
     std::vector<std::string> lines;

@@ -1,0 +1,168 @@
+// Generated programs answer of a projected document what they answer of the whole one.
+#include "Plan/PlanTesting.h"
+#include "Plan/ProgramGenerator.h"
+#include "Plan/Projection/XQueryProjectionPlan.h"
+#include "Platform/Reading/XMLDocuments.h"
+
+#include <chrono>
+#include <cstdlib>
+
+namespace xquery {
+namespace {
+
+using namespace plantest;
+
+unsigned numberFrom(const char* variable, unsigned otherwise) {
+  const char* value = std::getenv(variable);
+  return value ? static_cast<unsigned>(std::strtoul(value, nullptr, 10)) : otherwise;
+}
+
+XQueryLimits limits(std::chrono::seconds duration) {
+  XQueryLimits found;
+  found.duration = duration;
+  found.memoryCeiling = uint64_t{256} << 20;
+  return found;
+}
+
+Value projected(const XQuery& query, std::string_view xml, uint32_t options, XMLWay way) {
+  const auto* plan = query._internal().projectionPlan();
+  TextSource source(xml);
+  NSXMLParseError failure;
+  const Ref<NSXMLDocument> document =
+      readDocument(source, options, failure, way, plan->isPossible() ? &plan->projection : nullptr);
+  EXPECT_TRUE(document) << failure.message;
+  return document;
+}
+
+// The document that is left as the context item is not the same.
+Outcome withoutFocus(Outcome outcome) {
+  std::erase_if(outcome.lines, [](const std::string& line) { return line.starts_with("left "); });
+  return outcome;
+}
+
+bool endedAtLimit(const Outcome& outcome) {
+  return !outcome.lines.empty() && outcome.lines.front().find("limit: ") != std::string::npos;
+}
+
+// Whether the program needs less than all.
+bool agrees(const std::string& text, const std::string& xml, uint32_t options) {
+  const auto query = compiled(text, XQueryWay::Planned);
+  const auto* plan = query->_internal().projectionPlan();
+  if (!plan || !plan->isPossible()) return false;
+  TextSource source(xml);
+  NSXMLParseError failure;
+  const Value whole = readDocument(source, options, failure);
+  const Outcome expected =
+      withoutFocus(outcomeOf(*compiled(text), whole, {}, limits(std::chrono::seconds(1))));
+  if (endedAtLimit(expected)) return false;
+  for (const XMLWay way : {XMLWay::Either, XMLWay::LibXML}) {
+    const Value part = projected(*query, xml, options, way);
+    EXPECT_EQ(expected.lines,
+              withoutFocus(outcomeOf(*query, part, {}, limits(std::chrono::seconds(60)))).lines)
+        << text << "\n"
+        << xml << "\n"
+        << plan->projection.description();
+  }
+  return true;
+}
+
+TEST(ProjectedPrograms, GeneratedOnesAnswerTheSame) {
+  const unsigned first = numberFrom("XQUERY_PLAN_SEED", 1);
+  const unsigned count = numberFrom("XQUERY_PLAN_PROGRAMS", 600);
+  const std::chrono::seconds time(numberFrom("XQUERY_PLAN_SECONDS", 0));
+  const auto end = std::chrono::steady_clock::now() + time;
+  size_t needsLess = 0;
+  unsigned seed = first;
+  for (; time.count() ? std::chrono::steady_clock::now() < end : seed < first + count; ++seed) {
+    ProgramGenerator generator(seed);
+    const std::string xml = generator.document();
+    const std::string program = generator.program();
+    SCOPED_TRACE("XQUERY_PLAN_SEED=" + std::to_string(seed));
+    const uint32_t options = seed % 2 ? NSXMLNodePreserveWhitespace : NSXMLNodeOptionsNone;
+    needsLess += agrees(program, xml, options) ? 1 : 0;
+    if (HasFailure()) break;
+  }
+  EXPECT_GT(needsLess * 20, seed - first) << needsLess << " of " << seed - first;
+}
+
+// Questions that need little, put together at random, over the same documents.
+class Questions {
+ public:
+  explicit Questions(unsigned seed) : _random(seed) {}
+
+  std::string question() {
+    switch (_random.below(8)) {
+      case 0:
+        return "for $n in " + path() + " where " + condition("$n") + " return " +
+               use("$n" + tail());
+      case 1:
+        return "let $n := " + path() + " return (" + use("$n" + tail()) + ", " + use("$n") + ")";
+      case 2:
+        return "some $n in " + path() + " satisfies " + condition("$n");
+      case 3:
+        return use("(" + path() + " " + _random.oneOf({"|", "intersect", "except", ","}) + " " +
+                   path() + ")");
+      case 4:
+        return "<r n='{" + use(path()) + "}'>{" + path() + "/text()}</r>";
+      case 5:
+        return "for $n in " + path() + " order by string($n" + tail() + ") return " + use("$n");
+      default:
+        return use(path());
+    }
+  }
+
+ private:
+  std::string name() { return _random.oneOf({"a", "b", "c", "*", "*:a", "b", "c"}); }
+  std::string predicate() {
+    return _random.oneOf({"[1]", "[last()]", "[@x]", "[b]", "[c = 1]", "[@y = 'u']",
+                          "[position() < 3]", "[not(a)]", "[a/b]", "[text()]", "[. = '1']",
+                          "[name() = 'b']", "[count(*) > 1]", "[string-length(.) > 1]"});
+  }
+  std::string step() {
+    std::string text = name();
+    if (_random.below(3) == 0) text += predicate();
+    return text;
+  }
+  std::string path() {
+    std::string text =
+        _random.oneOf({"/a/", "//", "//", "/*/", "/a//", "/a/descendant::", "/a/*/"});
+    text += step();
+    for (size_t i = _random.below(3); i > 0; --i) text += "/" + step();
+    return text;
+  }
+  std::string tail() {
+    return _random.oneOf(
+        {"", "/@x", "/text()", "/b", "/*", "/self::a", "/@*", "/string()", "/node()", "/c/b"});
+  }
+  std::string condition(const std::string& node) {
+    return _random.oneOf({node + "/@x = 1", "exists(" + node + "/b)", node + " = 'u'",
+                          "count(" + node + "/*) > 1", node + "/b = " + node + "/c",
+                          "not(" + node + tail() + ")"});
+  }
+  std::string use(const std::string& path) {
+    return _random.oneOf({"count(", "exists(", "distinct-values(", "(", "(", "sum(", "data("})
+        .append(path)
+        .append(")");
+  }
+
+  RandomChoices _random;
+};
+
+TEST(ProjectedPrograms, QuestionsThatNeedLittleAnswerTheSame) {
+  const unsigned first = numberFrom("XQUERY_PLAN_SEED", 1);
+  const unsigned count = numberFrom("XQUERY_PLAN_PROGRAMS", 1500);
+  size_t needsLess = 0;
+  for (unsigned seed = first; seed < first + count; ++seed) {
+    ProgramGenerator generator(seed);
+    const std::string xml = generator.document();
+    Questions questions(seed);
+    SCOPED_TRACE("XQUERY_PLAN_SEED=" + std::to_string(seed));
+    const uint32_t options = seed % 2 ? NSXMLNodePreserveWhitespace : NSXMLNodeOptionsNone;
+    needsLess += agrees(questions.question(), xml, options) ? 1 : 0;
+    if (HasFailure()) break;
+  }
+  EXPECT_GT(needsLess * 2, count);
+}
+
+}  // namespace
+}  // namespace xquery
