@@ -123,6 +123,14 @@ void lookAtError(XQueryChecking& checking, XQueryPlaceID call, std::string_view)
   checking.warn(call, ID::CallDiffers, {"error of what is no QName", "its code is lost"});
 }
 
+// "en-US" matches "en-GB", the language alone being compared.
+void lookAtLang(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* language = checking.textIn(checking.argument(call, 0));
+  if (!language || language->view().find(u'-') == NSStringView::notFound) return;
+  checking.warn(call, ID::CallDiffers,
+                {"lang of a language with a region", "the language alone is compared"});
+}
+
 // Of what is known to hold both, and of no item that may be anything.
 void lookAtDistinct(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
   const XQueryFacts& facts = checking.factsOf(checking.argument(call, 0));
@@ -263,6 +271,7 @@ constexpr auto rows = std::to_array<Row>({
     {"node-name", lookAtNodeName},
     {"error", lookAtError},
     {"distinct-values", lookAtDistinct},
+    {"lang", lookAtLang},
     {"normalize-unicode", lookAtNormalForm},
     {"matches", lookAtPattern},
     {"replace", lookAtPattern},

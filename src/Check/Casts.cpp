@@ -16,6 +16,7 @@
 #include "xquery/XQuery.h"
 
 #include <algorithm>
+#include <cctype>
 #include <cmath>
 #include <string>
 #include <string_view>
@@ -108,6 +109,14 @@ bool isLanguage(std::string_view text) {
   });
 }
 
+// What XQuery 1.0 does not count among the digits of base 64.
+bool isBase64(std::string_view text) {
+  return std::all_of(text.begin(), text.end(), [](char c) {
+    return isSpace(c) || std::isalnum(static_cast<unsigned char>(c)) || c == '+' || c == '/' ||
+           c == '=';
+  });
+}
+
 // --- casts ---------------------------------------------------------------------------------------
 
 struct Cast {
@@ -150,12 +159,15 @@ bool isNumericType(XQueryTypeID type) {
 
 bool isAcceptedHereAlone(const Cast& cast, const NSObject& literal) {
   if (const auto* number = dyn_cast<NSNumber>(&literal)) {
-    return isBeyond32Bits(cast.type, number->doubleValue());
+    const double value = number->doubleValue();
+    const bool isCutToZero = cast.type == XQueryTypePositiveInteger && value > 0 && value < 1;
+    return isCutToZero || isBeyond32Bits(cast.type, value);
   }
   const auto* text = dyn_cast<NSString>(&literal);
   if (!text) return false;
   const std::string written = text->utf8();
   if (cast.type == XQueryTypeLanguage) return !isLanguage(written);
+  if (cast.type == XQueryTypeBase64Binary) return !isBase64(written);
   if (isNumericType(cast.type)) {
     return written.size() < 300 && isNumber(written, false, false) &&
            isBeyond32Bits(cast.type, std::strtod(written.c_str(), nullptr));

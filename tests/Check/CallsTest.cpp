@@ -29,6 +29,8 @@ TEST(CheckedCalls, WithArgumentsThatMakeADifference) {
       {"node-name()", "1 call-differs"},
       {"error('bad')", "1 call-differs"},
       {"distinct-values((true(), 1))", "1 call-differs"},
+      {"//a[lang('en-US')]", "1 call-differs"},
+      {"//a[lang('en')]", ""},
       {"number(//a[1]), node-name(/*), error(), error(QName('urn:e', 'e')), distinct-values(//a)",
        ""},
   });

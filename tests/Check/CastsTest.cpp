@@ -26,6 +26,9 @@ TEST(CheckedCasts, OfLiterals) {
       {"xs:time('23:59:60'), xs:time('12:00:00+99:00')", "1 cast-accepts, 1 cast-accepts"},
       {"xs:date('0000-01-01')", "1 cast-accepts"},
       {"xs:language('no language!')", "1 cast-accepts"},
+      {"xs:base64Binary('Q*Q==')", "1 cast-accepts"},
+      {"xs:positiveInteger(0.5)", "1 cast-accepts"},
+      {"xs:base64Binary('QQ =='), xs:positiveInteger(1), xs:nonNegativeInteger(0.5)", ""},
       {"xs:int(2147483647), xs:time('23:59:59+14:00'), xs:language('en-US'), xs:long('9999999999')",
        ""},
   });
