@@ -27,8 +27,8 @@ struct XQueryWarning {
 
 // The warnings of a query that was compiled to be explained, in the order of its text and behind
 // them those of the modules that it imports, one after another. None for a query that was compiled
-// in another way and for one with errors; at most 10,000. They are found while the query is compiled,
-// within the limits of the compilation.
+// in another way and for one with errors; at most 10,000. They are found while the query is
+// compiled, within the limits of the compilation.
 //
 //   auto query = XQuery::xqueryWithSource("let $a := 1 return 2", XQueryLoading(), XQueryLimits(),
 //                                         XQueryWay::Explained);
