@@ -28,9 +28,9 @@ class ProjectedElements {
   States::NameID nameOf(std::string_view localName) const { return _states.nameOf(localName); }
   // Whether nothing is needed here but that the text is well formed.
   bool isDead() const { return _dead > 0; }
-  const States::State& state() const { return _states[_state]; }
+  const States::State& state() const { return *_state; }
   bool needsTexts() const { return !isDead() && state().needsTexts; }
-  bool needsComments() const { return !isDead() && _state == States::All; }
+  bool needsComments() { return !isDead() && _state == _states.all(); }
   bool needsInstructions() const { return !isDead() && state().needsInstructions; }
 
   // An element opens. `isNeeded(state)` tells whether its tag is: for attributes, and for what it
@@ -43,13 +43,13 @@ class ProjectedElements {
       ++_dead;
       return false;
     }
-    const States::StateID state = _states.below(_state, nameID);
+    States::State* const state = _states.below(_state, nameID);
     const bool isRoot = _open.empty();
-    if (state == States::Dead && !isRoot) {
+    if (state == _states.dead() && !isRoot) {
       _dead = 1;
       return false;
     }
-    const bool isBuilt = isRoot || _states[state].needsItself || isNeeded(_states[state]);
+    const bool isBuilt = isRoot || state->needsItself || isNeeded(*state);
     if (isBuilt) buildAbove(build);
     _open.push_back({_state, isBuilt, name});
     if (isBuilt) _built = _open.size();
@@ -80,14 +80,14 @@ class ProjectedElements {
 
  private:
   struct Level {
-    States::StateID outside;
+    States::State* outside;
     bool isBuilt;
     Name name;
   };
 
   ReadTree& _tree;
   States _states;
-  States::StateID _state = States::Document;
+  States::State* _state = _states.document();
   std::vector<Level, ValueAllocator<Level>> _open;  // but for those that are only counted
   size_t _built = 0;                                // so many of them are in the tree
   size_t _dead = 0;

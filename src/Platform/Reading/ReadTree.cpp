@@ -99,12 +99,11 @@ const NSStringView* ReadTree::storedLasting(const ReadText& text) {
   return withStorable(text, Storing{_builder});
 }
 
-void ReadTree::check(const ReadText& text) {
-  if (text.isASCII) return;
-  for (std::string_view rest = text.bytes; !rest.empty();) {
-    const std::string_view part = firstPart(rest);
+void ReadTree::checkWide(std::string_view text) {
+  while (!text.empty()) {
+    const std::string_view part = firstPart(text);
     static_cast<void>(widened(part));
-    rest.remove_prefix(part.size());
+    text.remove_prefix(part.size());
   }
 }
 

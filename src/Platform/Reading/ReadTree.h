@@ -46,9 +46,13 @@ class ReadTree {
   void addComment(const ReadText& text);
   void addInstruction(const NSXMLName* target, const ReadText& text);
   // Something follows that ends a run of text, whether or not it is put into the tree.
-  void endText() { flush(); }
+  void endText() {
+    if (hasText()) flush();
+  }
   // Throws for what is none at once, not when it is put into the tree.
-  void check(const ReadText& text);
+  void check(const ReadText& text) {
+    if (!text.isASCII) checkWide(text.bytes);
+  }
   // For nodes to share.
   const NSStringView* stored(const ReadText& text);
   const NSStringView* storedLasting(const ReadText& text);
@@ -78,6 +82,7 @@ class ReadTree {
   template <class Add>
   auto withStorable(const ReadText& text, Add add);
   NSStringView widened(std::string_view text);
+  void checkWide(std::string_view text);
   const NSStringView* storedAlone(std::string_view text);
   void endSpaceChange();
   void hearSpace(const NSXMLName* name, std::string_view value);

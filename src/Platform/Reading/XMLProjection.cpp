@@ -76,14 +76,12 @@ XMLProjectionStates::XMLProjectionStates(const XMLProjection& projection)
     for (const std::string& name : place.attributes) attributes.push_back(addName(name));
   }
   const size_t names = _names.size() + 1;
-  _states.resize(Document + 1);
-  _states[Dead].next.assign(names, Dead);
-  State& all = _states[All];
-  all.needsItself = all.needsTexts = all.needsAttributes = all.needsInstructions = true;
-  all.next.assign(names, All);
-  State& root = _states[Document];
+  _dead.next.assign(names, &_dead);
+  _all.needsItself = _all.needsTexts = _all.needsAttributes = _all.needsInstructions = true;
+  _all.next.assign(names, &_all);
+  State& root = _states.emplace_back();
   root.places = {XMLProjection::document};
-  root.next.assign(names, unknown);
+  root.next.assign(names, nullptr);
   concludeFrom(root);
 }
 
@@ -99,8 +97,8 @@ XMLProjectionStates::NameID XMLProjectionStates::nameOf(std::string_view localNa
   return found == _names.end() ? otherName : found->second;
 }
 
-XMLProjectionStates::StateID XMLProjectionStates::makeBelow(StateID parent, NameID name) {
-  const State& from = _states[parent];
+XMLProjectionStates::State* XMLProjectionStates::makeBelow(State* parent, NameID name) {
+  const State& from = *parent;
   State state;
   state.above = from.above;
   state.isInValue = from.isInValue;
@@ -128,9 +126,7 @@ XMLProjectionStates::StateID XMLProjectionStates::makeBelow(StateID parent, Name
       }
     }
   }
-  const StateID found = stateOf(std::move(state));
-  _states[parent].next[name] = found;
-  return found;
+  return parent->next[name] = stateOf(std::move(state));
 }
 
 // What follows from the places.
@@ -147,25 +143,23 @@ void XMLProjectionStates::concludeFrom(State& state) const {
   }
 }
 
-XMLProjectionStates::StateID XMLProjectionStates::stateOf(State state) {
+XMLProjectionStates::State* XMLProjectionStates::stateOf(State state) {
   std::sort(state.places.begin(), state.places.end());
   std::sort(state.above.begin(), state.above.end());
-  if (state.places.empty() && state.above.empty() && !state.isInValue) return Dead;
+  if (state.places.empty() && state.above.empty() && !state.isInValue) return &_dead;
   for (const XMLProjection::PlaceID place : state.places) {
-    if (_projection.places()[place].needs & XMLProjection::Below) return All;
+    if (_projection.places()[place].needs & XMLProjection::Below) return &_all;
   }
-  for (size_t i = Document; i < _states.size(); ++i) {
-    const State& known = _states[i];
+  for (State& known : _states) {
     if (known.places == state.places && known.above == state.above &&
         known.isInValue == state.isInValue) {
-      return static_cast<StateID>(i);
+      return &known;
     }
   }
-  if (_states.size() >= mostStates) return All;
+  if (_states.size() >= mostStates) return &_all;
   concludeFrom(state);
-  state.next.assign(_names.size() + 1, unknown);
-  _states.push_back(std::move(state));
-  return static_cast<StateID>(_states.size() - 1);
+  state.next.assign(_names.size() + 1, nullptr);
+  return &_states.emplace_back(std::move(state));
 }
 
 }  // namespace xquery

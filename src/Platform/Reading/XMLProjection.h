@@ -67,21 +67,18 @@ class XMLProjection {
 };
 
 // The projection while one document is read: a machine whose states are the sets of places that an
-// element belongs to, made as they are met. What nothing below is needed of has the state `Dead`,
-// and what all is needed of the state `All`, for itself and for everything below.
+// element belongs to, made as they are met. What nothing below is needed of has the state `dead`,
+// and what all is needed of the state `all`, for itself and for everything below.
 class XMLProjectionStates {
  public:
   explicit XMLProjectionStates(const XMLProjection& projection);
+  XMLProjectionStates(const XMLProjectionStates&) = delete;
+  XMLProjectionStates& operator=(const XMLProjectionStates&) = delete;
 
   using NameID = uint32_t;
   static constexpr NameID otherName = 0;
   // Of a local name; the same for all names that no step asks for.
   NameID nameOf(std::string_view localName) const;
-
-  using StateID = uint32_t;
-  static constexpr StateID Dead = 0;
-  static constexpr StateID All = 1;
-  static constexpr StateID Document = 2;
 
   struct State {
     bool needsItself = false;
@@ -102,23 +99,24 @@ class XMLProjectionStates {
     std::vector<XMLProjection::PlaceID> places;  // of which such an element is
     std::vector<XMLProjection::PlaceID> above;   // whose steps to anywhere below lead in here
     bool isInValue = false;                      // the string value of something above is needed
-    std::vector<StateID> next;                   // by name; `unknown` until it is asked for
+    std::vector<State*> next;                    // by name; null until it is asked for
   };
-  const State& operator[](StateID state) const { return _states[state]; }
+  State* dead() { return &_dead; }
+  State* all() { return &_all; }
+  State* document() { return &_states.front(); }
   // Of an element of that name whose parent has the state.
-  StateID below(StateID parent, NameID name) {
-    const StateID known = _states[parent].next[name];
-    return known != unknown ? known : makeBelow(parent, name);
+  State* below(State* parent, NameID name) {
+    State* const known = parent->next[name];
+    return known ? known : makeBelow(parent, name);
   }
 
  private:
-  static constexpr StateID unknown = UINT32_MAX;
   // A projection may have more states than it is worth to tell apart: all is made of the rest.
   static constexpr size_t mostStates = 250;
 
   NameID addName(const std::string& name);
-  StateID makeBelow(StateID parent, NameID name);
-  StateID stateOf(State state);
+  State* makeBelow(State* parent, NameID name);
+  State* stateOf(State state);
   void concludeFrom(State& state) const;
 
   const XMLProjection& _projection;
@@ -126,7 +124,9 @@ class XMLProjectionStates {
   // Of the places: the names of their steps and of their attributes.
   std::vector<std::vector<NameID>> _stepNames;
   std::vector<std::vector<NameID>> _attributeNames;
-  std::deque<State> _states;
+  State _dead;
+  State _all;
+  std::deque<State> _states;  // the document first
 };
 
 }  // namespace xquery

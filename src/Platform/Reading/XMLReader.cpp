@@ -77,6 +77,10 @@ class XMLReader {
     bool isPlain = true;
 
     std::string_view bytes() const { return {begin, static_cast<size_t>(end - begin)}; }
+    // Whether nothing is left to be looked at, whoever needs it.
+    bool isSurelyRight() const {
+      return isPlain && !wide && static_cast<size_t>(end - begin) <= longestPieceTaken;
+    }
   };
   struct Attribute {
     ReadName* name;
@@ -119,7 +123,7 @@ class XMLReader {
   void buildAbove();
   bool hasNeededAttribute(const Projected::States::State& state) const;
   void addNeededAttributes(const Projected::States::State& state);
-  void checkTag(const ReadName& name);
+  void checkTag();
   void checkDistinct();
   ReadText valueOf(const Raw& value);
   const char* readEndTag(const char* at);
@@ -296,11 +300,11 @@ ReadText XMLReader::knownText(const Raw& text) {
 }
 
 void XMLReader::addText(const Raw& text, bool isWhole) {
+  const bool isNeeded = !_projected || _projected->needsTexts();
+  if (!isNeeded && text.isSurelyRight()) return;
   const ReadText known = knownText(text);
-  if (_projected) {
-    if (!_projected->needsTexts()) return _tree.check(known);
-    buildAbove();
-  }
+  if (!isNeeded) return _tree.check(known);
+  if (_projected) buildAbove();
   if (isWhole && !_tree.hasText()) {
     _tree.addWholeText(known);
   } else {
@@ -312,6 +316,7 @@ void XMLReader::addText(const Raw& text, bool isWhole) {
 // --- tags ------------------------------------------------------------------------------------
 
 const char* XMLReader::skipSpace(const char* at) const {
+  if (at < _end && !isXMLSpace(*at)) return at;
   for (WorkPacer pacer; at < _end && isXMLSpace(*at); ++at) pacer.turn();
   return at;
 }
@@ -461,7 +466,7 @@ void XMLReader::openProjected(ReadName& name) {
     return _hasScope || (state.needsAnyAttribute() && hasNeededAttribute(state));
   };
   if (!_projected->open(name.selected, {&name, name.prefix->bound}, isNeeded, build)) {
-    return checkTag(name);
+    return checkTag();
   }
   _tree.openElement(_names.elementName(name));
   if (_declares) addNamespaces();
@@ -487,12 +492,13 @@ void XMLReader::addNeededAttributes(const Projected::States::State& state) {
   }
 }
 
-void XMLReader::checkTag(const ReadName& name) {
-  ReadNames::checkElementName(name);
+void XMLReader::checkTag() {
   if (_attributes.empty()) return;
   checkDistinct();
   for (const Attribute& attribute : _attributes) {
-    if (!attribute.name->declares) _tree.check(valueOf(attribute.value));
+    if (!attribute.name->declares && !attribute.value.isSurelyRight()) {
+      _tree.check(valueOf(attribute.value));
+    }
   }
 }
 
