@@ -142,7 +142,7 @@ void LibXMLProjectionHandler::startElement(const LibXMLName& name,
     for (int index = 0; index < attributes.count() && !says; ++index) {
       const LibXMLName attribute = attributes.name(index);
       says = isOfXML(attribute) ||
-                 (state.needsAnyAttribute() && state.needsAttribute(selected(attribute.localName)));
+             (state.needsAnyAttribute() && state.needsAttribute(selected(attribute.localName)));
     }
     return says;
   };
