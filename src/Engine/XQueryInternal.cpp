@@ -77,8 +77,12 @@ void XQueryInternal::planStream() {
 void XQueryInternal::planToProfile() {
   auto profiled = std::make_shared<XQueryProfiledProgram>();
   const auto start = std::chrono::steady_clock::now();
-  _body = XQueryProfiled(*_prolog, _body, *profiled);
+  std::optional<XQueryProjectionPlan> projection;
+  _body = XQueryProfiled(*_prolog, _body, projection, *profiled);
   profiled->planning = std::chrono::steady_clock::now() - start;
+  if (projection) {
+    _projectionPlan = std::make_unique<const XQueryProjectionPlan>(std::move(*projection));
+  }
   _profiledProgram = std::move(profiled);
 }
 

@@ -55,16 +55,21 @@ Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>&
   projection = XQueryPlanProjection(program, planning.facts);
   std::vector<XQueryPlanNote> notes;
   applyRules(planning, XQueryRules(), &notes);
-  report = XQueryPlanReport(planning, std::move(notes), projection);
+  report = XQueryPlanReport(planning, std::move(notes));
+  report.addInput(planning, projection);
   return program.install();
 }
 
 Ref<XQueryExpr> XQueryProfiled(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
+                               std::optional<XQueryProjectionPlan>& projection,
                                XQueryProfiledProgram& profiled) {
   XQueryProgram program(prolog, body);
   XQueryPlanning planning(program);
   std::vector<XQueryPlanNote> notes;
-  if (XQueryPlanIsEnabled()) applyRules(planning, XQueryRules(), &notes);
+  if (XQueryPlanIsEnabled()) {
+    projection = XQueryPlanProjection(program, planning.facts);
+    applyRules(planning, XQueryRules(), &notes);
+  }
   const XQueryPlanReport report(planning, std::move(notes));
   XQueryProfileProgram(planning, report, prolog, profiled);
   return program.install();

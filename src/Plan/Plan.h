@@ -14,6 +14,7 @@
 #include "Plan/Report.h"
 #include "Plan/Rules.h"
 
+#include <optional>
 #include <span>
 
 namespace xquery {
@@ -36,9 +37,10 @@ Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>&
 // The same, and what there is to say of it.
 Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
                               XQueryProjectionPlan& projection, XQueryPlanReport& report);
-// The same, or where queries are not planned the program as it is written, with expressions that
-// count in it; and what there is to say of these.
+// The same, with expressions that count in it, and what there is to say of these; where queries are
+// not planned the program as it is written, which is read a whole document.
 Ref<XQueryExpr> XQueryProfiled(const XQueryProlog& prolog, const Ref<XQueryExpr>& body,
+                               std::optional<XQueryProjectionPlan>& projection,
                                XQueryProfiledProgram& profiled);
 
 }  // namespace xquery

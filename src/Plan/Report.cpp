@@ -182,11 +182,8 @@ std::string labelLine(std::string_view text) {
 }  // namespace
 
 XQueryPlanReport::XQueryPlanReport(const XQueryPlanning& planning,
-                                   std::vector<XQueryPlanNote> notes,
-                                   const XQueryProjectionPlan& projection)
-    : _entries(Listing(planning, std::move(notes)).entries()) {
-  addInput(planning, projection);
-}
+                                   std::vector<XQueryPlanNote> notes)
+    : _entries(Listing(planning, std::move(notes)).entries()) {}
 
 void XQueryPlanReport::addInput(const XQueryPlanning& planning,
                                 const XQueryProjectionPlan& projection) {

@@ -35,8 +35,9 @@ class XQueryPlanReport {
 
   XQueryPlanReport() = default;
   // The rules have been applied.
-  XQueryPlanReport(const XQueryPlanning& planning, std::vector<XQueryPlanNote> notes,
-                   const XQueryProjectionPlan& projection);
+  XQueryPlanReport(const XQueryPlanning& planning, std::vector<XQueryPlanNote> notes);
+  // The last entry: what is read of the document, if anything looks at it.
+  void addInput(const XQueryPlanning& planning, const XQueryProjectionPlan& projection);
 
   // Wholes before their parts; last, what is read of the document, if anything looks at it.
   const std::vector<Entry>& entries() const { return _entries; }
@@ -51,8 +52,6 @@ class XQueryPlanReport {
   std::string DOT() const;
 
  private:
-  void addInput(const XQueryPlanning& planning, const XQueryProjectionPlan& projection);
-
   std::vector<Entry> _entries;
 };
 

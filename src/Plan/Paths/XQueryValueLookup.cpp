@@ -161,8 +161,7 @@ bool XQueryValueLookup::find(NSXMLNode* node, int axis, XQueryStepTest& test,
   const auto indexed = NSXMLIndexedValues::of(_key, range.first, range.stop);
   if (!indexed.values) return false;
   addNodesWith(*indexed.values, probes, range.first, range.stop, test, candidates);
-}
-return axis != XQueryAxisChild || keepChildren(node, candidates);
+  return axis != XQueryAxisChild || keepChildren(node, candidates);
 }
 
 void XQueryValueLookup::noteAsked(const NSXMLNode* node, size_t nodes) const {
