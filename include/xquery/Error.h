@@ -9,8 +9,75 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace xquery {
+
+// What kind of failure an error tells of, so that nobody has to read its text, which a query can
+// imitate.
+enum class XQueryErrorCategory : uint8_t {
+  Syntax,         // the text of the query: its tokens, its grammar, what a prolog says twice
+  Names,          // names that are not declared, not resolved or declared twice
+  Types,          // a value of another type or number of items than is asked for
+  Values,         // a value of the right type that cannot be used
+  Loading,        // a module that cannot be had
+  Limit,          // a limit of the host or of the engine was reached
+  RaisedByQuery,  // fn:error
+  Internal,       // how the engine is used; also what says of no error which of these it is
+};
+
+// The numbers, which are those of the language's error codes.
+enum class XQueryErrorNumber : int64_t {
+  None = 0,  // raised by the query, a limit, or a code that stands in the text
+  UnresolvedName = 1,
+  Syntax = 3,
+  Type = 6,
+  Undefined = 8,
+  Extension = 14,
+  Unbound = 16,
+  Arguments = 17,
+  ItemKind = 19,
+  ContextItem = 20,
+  AttributeNotDistinct = 25,
+  InvalidInstruction = 26,
+  InvalidDocument = 28,
+  Version = 31,
+  BaseURIDeclaredTwice = 32,
+  PrefixReused = 33,
+  FunctionDeclaredTwice = 34,
+  DuplicateDefinition = 37,
+  CollationDeclaredTwice = 38,
+  DuplicateParameter = 39,
+  AttributeIsXmlns = 44,
+  ReservedFunctionName = 45,
+  InvalidNamespaceURI = 46,
+  ModuleNotFound = 47,
+  OutsideModule = 48,
+  VariableDeclaredTwice = 49,
+  InheritNamespacesDeclaredTwice = 55,
+  OrderingDeclaredTwice = 65,
+  ConstructionDeclaredTwice = 67,
+  XMLSpaceDeclaredTwice = 68,
+  EmptyOrderingDeclaredTwice = 69,
+  InvalidNamespace = 70,
+  InvalidComment = 72,
+};
+
+// A piece of the text of a query or a library module. All counts are of characters, which are code
+// points: a tab is one, and so is the end of a line, however it is written.
+struct XQuerySourcePlace {
+  Ref<NSString> moduleURL;   // null for the query itself
+  int64_t line;              // from 1
+  int64_t column;            // from 1
+  int64_t length;            // of a piece on several lines that of all of them
+  Ref<NSString> sourceLine;  // the text of the line, without its end
+};
+
+// A call of a declared function.
+struct XQueryErrorCall {
+  Ref<NSString> function;                  // the name as the call has it, prefix included
+  std::optional<XQuerySourcePlace> place;  // of the call
+};
 
 // What every error object answers. Errors are immutable.
 class XQUERY_EXPORT NSError : public NSCounted {
@@ -75,6 +142,13 @@ class XQUERY_EXPORT XQueryError : public NSError {
                                               int64_t atLine, Ref<NSString> sourceLine,
                                               int64_t inColumn);
 
+  // The same error of that category. Without being told an error is one of Internal, and with a
+  // line of the query's text one of Syntax.
+  [[nodiscard]] static Ref<XQueryError> error(XQueryErrorCategory ofCategory, int64_t number,
+                                              const Ref<NSString>& withMsg);
+  [[nodiscard]] static Ref<XQueryError> error(XQueryErrorCategory ofCategory, int64_t number,
+                                              const Ref<NSString>& withMsg, int64_t atLine);
+
   // The same error, known to be one of the module at that URL.
   [[nodiscard]] static Ref<XQueryError> errorInModule(const XQueryError& error,
                                                       Ref<NSString> moduleURL);
@@ -91,25 +165,48 @@ class XQUERY_EXPORT XQueryError : public NSError {
   // Null for an error of the query itself, and for one that arises while it is evaluated.
   const Ref<NSString>& moduleURL() const { return _moduleURL; }
 
+  XQueryErrorCategory category() const { return _category; }
+  // The same as the code; a host's own error may have a number that is none of the enumeration.
+  XQueryErrorNumber number() const { return static_cast<XQueryErrorNumber>(_err); }
+  // The innermost expression that was being evaluated, or what a compilation could not use; nothing
+  // where that is not known. A line here is that of the place's first character, which line() need
+  // not be.
+  //
+  //   if (const auto place = error->place()) mark(place->line, place->column, place->length);
+  std::optional<XQuerySourcePlace> place() const;
+  // The calls of declared functions that led there, innermost first: the place of the error is in
+  // the function of the first one, the place of each call in that of the next one. Of more than 64
+  // these are the 32 innermost and the 32 outermost.
+  std::vector<XQueryErrorCall> calls() const;
+  // How many calls are missing between those.
+  int64_t callsLeftOut() const;
+
   // XQueryError:3 - "message" at line:5, or without the last part when no line is known. A missing
   // message prints as (null). For an error of a module a second line names it, and its line again:
   // two blanks, "at ", the URL and ":5".
   Ref<NSString> localizedDescription() const override;
 
+  // For the engine itself: what place and calls are found in, and the same error with that.
+  const NSCounted* _trace() const { return _placeAndCalls.get(); }
+  [[nodiscard]] static Ref<XQueryError> _errorWithTrace(const XQueryError& error,
+                                                        Ref<NSCounted> trace);
+
  protected:
-  XQueryError(int64_t number, Ref<NSString> msg, int64_t line, Ref<NSString> sourceLine = nullptr,
-              int64_t column = 0);
-  XQueryError(const XQueryError& error, Ref<NSString> moduleURL);
+  XQueryError(XQueryErrorCategory category, int64_t number, Ref<NSString> msg, int64_t line,
+              Ref<NSString> sourceLine = nullptr, int64_t column = 0);
+  XQueryError(const XQueryError& error, Ref<NSString> moduleURL, Ref<NSCounted> trace);
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
+  XQueryErrorCategory _category;
   int64_t _err;
   Ref<NSString> _msg;
   int64_t _line;
   Ref<NSString> _sourceLine;
   int64_t _column;
   Ref<NSString> _moduleURL;
+  Ref<NSCounted> _placeAndCalls;
 };
 
 // The one exception type of the engine, thrown and caught inside it; a run-time error has the name

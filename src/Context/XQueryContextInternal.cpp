@@ -4,6 +4,7 @@
 #include "Platform/Base/NSLog.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
+#include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/TypesContext.h"
 #include "Types/XQueryDate.h"
@@ -16,13 +17,8 @@
 
 namespace xquery {
 
-// A query may give an error of its own any namespace to begin with, but not a text without the
-// number sign after it.
 bool XQueryIsLimit(const XQueryError* error) {
-  if (!error || error->err() != 0 || !error->msg()) return false;
-  const NSStringView text = error->msg()->view();
-  return text.startsWith(NSStringView::ascii("limit: ")) &&
-         text.find(u'#') == NSStringView::notFound;
+  return error && error->category() == XQueryErrorCategory::Limit;
 }
 
 namespace {
@@ -173,16 +169,40 @@ void logAsAssertionFailure(const Ref<XQueryError>& error) {
 
 void XQueryContextInternal::setError(Ref<XQueryError> error, bool raiseException) {
   _error = std::move(error);
+  _isThrownOn = false;
   if (!raiseException) return;
   if (XQueryLogEnabled()) logAsAssertionFailure(_error);
   throwError(_error);
 }
 
-Value XQueryContextInternal::fail(Ref<XQueryError> error) {
+Value XQueryContextInternal::fail(Ref<XQueryError> error, XQueryPlaceNumber at) {
   _error = std::move(error);
+  _failureTrace.begin(at);
   if (XQueryLogEnabled()) logAsAssertionFailure(_error);
   _failure = Failure::Error;
   return {};
+}
+
+void XQueryContextInternal::failAsRaised(XQueryPlaceNumber at) {
+  if (!std::exchange(_isThrownOn, false)) _failureTrace.begin(at);
+  _failure = Failure::Error;
+}
+
+void XQueryContextInternal::failForWantOfMemory(XQueryPlaceNumber at) {
+  if (!std::exchange(_isThrownOn, false)) _failureTrace.begin(at);
+  _failure = Failure::WantOfMemory;
+}
+
+Ref<XQueryError> XQueryContextInternal::traced(const Ref<XQueryError>& error) const {
+  if (!error || !_prolog || !(isFailing() || _isThrownOn)) return error;
+  return _failureTrace.on(*error, _prolog->modules().places());
+}
+
+Ref<XQueryError> XQueryContextInternal::placed(const Ref<XQueryError>& error,
+                                               XQueryPlaceNumber at) const {
+  if (!_prolog || XQueryErrorTrace::of(*error)) return error;
+  return XQueryError::_errorWithTrace(
+      *error, XQueryErrorTrace::traceInPlaces(_prolog->modules().places(), at));
 }
 
 void XQueryContextInternal::passOverFailure(Ref<XQueryError> error) {
@@ -191,6 +211,7 @@ void XQueryContextInternal::passOverFailure(Ref<XQueryError> error) {
 }
 
 void XQueryContextInternal::throwFailure() {
+  _isThrownOn = true;
   if (std::exchange(_failure, Failure::None) == Failure::WantOfMemory) throw std::bad_alloc();
   throwError(_error);
 }
@@ -198,6 +219,14 @@ void XQueryContextInternal::throwFailure() {
 void XQueryContextInternal::raise(Ref<XQueryError> error) {
   setError(std::move(error), true);
   __builtin_unreachable();
+}
+
+void XQueryContextInternal::raise(Ref<XQueryError> error, XQueryPlaceNumber at) {
+  _error = std::move(error);
+  if (XQueryLogEnabled()) logAsAssertionFailure(_error);
+  _failureTrace.begin(at);
+  _isThrownOn = at != 0;
+  throwError(_error);
 }
 
 void XQueryRaise(XQueryContext& context, Ref<XQueryError> error) {

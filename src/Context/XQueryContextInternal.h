@@ -2,6 +2,7 @@
 // error and what is kept from one evaluation to the next.
 #pragma once
 
+#include "Context/FailureTrace.h"
 #include "Context/KeptValues.h"
 #include "Context/XQueryFrame.h"
 #include "Platform/Base/NSLog.h"
@@ -132,20 +133,32 @@ class XQueryContextInternal {
   // whose reason is the error's description. With diagnostics on it is an assertion failure, logged
   // and thrown under a name of its own.
   void setError(Ref<XQueryError> error, bool raiseException);
-  // For code that always raises.
+  // For code that always raises. Who says where the error arose knows better than the expression
+  // that is being evaluated.
   [[noreturn]] void raise(Ref<XQueryError> error);
+  [[noreturn]] void raise(Ref<XQueryError> error, XQueryPlaceNumber at);
 
   // --- failing -----------------------------------------------------------------------------------
   // An error is on its way out from the expression that met it, which answered null, until somebody
   // passes over it or the evaluation has ended; nothing is evaluated meanwhile.
   bool isFailing() const { return _failure != Failure::None; }
   // For an expression, which answers what this answers: keeps the error like `raise` and throws
-  // nothing.
-  [[gnu::cold]] Value fail(Ref<XQueryError> error);
+  // nothing. An error that has arisen before keeps its place.
+  [[gnu::cold]] Value fail(Ref<XQueryError> error, XQueryPlaceNumber at);
   // The error that was kept last has been raised by an exception, which ends here.
-  void failAsRaised() { _failure = Failure::Error; }
+  void failAsRaised(XQueryPlaceNumber at);
   // As yet without an error, for which there may be no memory before values are given back.
-  void failForWantOfMemory() { _failure = Failure::WantOfMemory; }
+  void failForWantOfMemory(XQueryPlaceNumber at);
+  // The failing passes a call on its way out.
+  void failThroughCall(XQueryPlaceNumber at, const NSString* function) {
+    _failureTrace.addCall(at, function);
+  }
+  // The error that is failing or has been thrown on, with its place and calls; with an error it is
+  // that one which they are those of.
+  Ref<XQueryError> tracedError() const { return traced(_error); }
+  Ref<XQueryError> traced(const Ref<XQueryError>& error) const;
+  // The error, which is not raised but answered as a value, with its place.
+  Ref<XQueryError> placed(const Ref<XQueryError>& error, XQueryPlaceNumber at) const;
   // Whether the evaluation ends, since a limit was reached, where other errors are passed over.
   bool isFailingForGood() const {
     return _failure == Failure::WantOfMemory || (isFailing() && XQueryIsLimit(_error.get()));
@@ -228,6 +241,8 @@ class XQueryContextInternal {
   bool _ordered = true;
   bool _showsErrors = XQueryLogEnabled();
   Failure _failure = Failure::None;
+  bool _isThrownOn = false;  // the failing has a place already, and goes on as an exception
+  XQueryFailureTrace _failureTrace;
 };
 
 // Whether the expression that answered this has met an error.

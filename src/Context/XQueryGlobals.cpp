@@ -18,9 +18,11 @@
 namespace xquery {
 namespace {
 
-[[noreturn]] void raiseUnresolved(const XQueryErrorText<1>& text, const XQueryQName& name,
+// At the declaration.
+template <class Declaration>
+[[noreturn]] void raiseUnresolved(const XQueryErrorText<1>& text, const Declaration& declaration,
                                   XQueryContextInternal& context) {
-  context.raise(text.error(name.XQueryStringValue()));
+  context.raise(text.error(declaration.name()->XQueryStringValue()), declaration.place());
 }
 
 void evaluateVariable(const XQueryVarDecl& declaration, XQueryContext& publicContext) {
@@ -28,7 +30,7 @@ void evaluateVariable(const XQueryVarDecl& declaration, XQueryContext& publicCon
   auto& context = publicContext._internal();
   const XQueryQName& name = *declaration.name();
   if (declaration.isExternal()) {
-    if (!context.globalForQName(name)) raiseUnresolved(unresolved, name, context);
+    if (!context.globalForQName(name)) raiseUnresolved(unresolved, declaration, context);
     return;
   }
   XQueryProlog* const prolog = context.activeProlog();
@@ -39,14 +41,14 @@ void evaluateVariable(const XQueryVarDecl& declaration, XQueryContext& publicCon
   context.setActiveProlog(prolog);
   context.setOrdered(ordered);
   if (XQueryHasFailed(value, publicContext)) context.throwFailure();
-  if (!value) raiseUnresolved(unresolved, name, context);
+  if (!value) raiseUnresolved(unresolved, declaration, context);
   context.setGlobal(value, declaration.name());
 }
 
 void checkFunction(const XQueryFunctionDecl& declaration, XQueryContextInternal& context) {
   const XQueryQName& name = *declaration.name();
   if (declaration.isExternal() && !context.XQueryExternalFunctionForQName(name)) {
-    raiseUnresolved(XQueryErrors::unresolvedExternalFunction, name, context);
+    raiseUnresolved(XQueryErrors::unresolvedExternalFunction, declaration, context);
   }
 }
 

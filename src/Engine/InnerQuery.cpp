@@ -75,6 +75,8 @@ XQueryInnerResult XQueryEvaluateInnerQuery(const Ref<NSString>& source, const Va
     const Ref<XQuery> query = XQuery::xqueryWithSource(source, loading);
     result.items = context->evaluateXQuery(*query, {}, contextItem, &result.error);
   });
+  // The text of the inner query is nowhere to be seen: its errors are where it was evaluated.
+  if (result.error) result.error = XQueryError::_errorWithTrace(*result.error, nullptr);
   if (XQueryIsLimit(result.error.get())) outer._internal().raise(result.error);
   return result;
 }

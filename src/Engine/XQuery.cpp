@@ -282,6 +282,8 @@ Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryCons
 void XQueryContext::beginEvaluation(const XQueryInternal& compiled) {
   endEvaluation();
   _private->askForDiagnostics();
+  // No place is left of what ended the evaluation before.
+  _private->setError(_private->error(), false);
   XQueryProlog& prolog = *compiled.prolog();
   _private->setOrdered(prolog.ordered());
   _private->setActiveProlog(&prolog);
@@ -294,6 +296,15 @@ void XQueryContext::endEvaluation() {
 }
 
 namespace {
+
+// Where there is no memory for the place of an error, the error is told without.
+Ref<XQueryError> tracedError(const XQueryContextInternal& context, const Ref<XQueryError>& error) {
+  try {
+    return context.traced(error);
+  } catch (const std::bad_alloc&) {
+    return error;
+  }
+}
 
 // The trees that come in from the host may be in use by other threads.
 void takeCredit(const Value& contextItem, const XQueryConstants& constants) {
@@ -334,10 +345,10 @@ Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
     return result;
   } catch (const NSException&) {
     if (XQueryIsLimit(_private->error().get())) dropValues(*_private, contextItem, position);
-    return _private->error();
+    return tracedError(*_private, _private->error());
   } catch (const std::bad_alloc&) {
     dropValues(*_private, contextItem, position);
-    return watch.allocationFailure().error();
+    return tracedError(*_private, watch.allocationFailure().error());
   } catch (const std::length_error&) {
     // Only decimals throw it.
     return XQueryErrors::tooManyDigits.error();

@@ -25,7 +25,8 @@ XQueryInternal::XQueryInternal(const Ref<NSString>& initWithSource, const XQuery
 
 void XQueryInternal::compile(const Ref<NSString>& source, const XQueryLoading& loading,
                              XQueryWay way) {
-  const auto parser = XQueryParser::parserWithSource(source);
+  const auto places = XQueryPlaces::places();
+  const auto parser = XQueryParser::parserWithSource(source, nullptr, places);
   _errors = parser->errors();
   if (!_errors.empty()) return;
 
@@ -40,7 +41,7 @@ void XQueryInternal::compile(const Ref<NSString>& source, const XQueryLoading& l
     _body = module->body();
   }
   _prolog = XQueryProlog::prologWithItems(items, nullptr, nullptr, version,
-                                          NSURLLoader::loaderWithLoading(loading));
+                                          NSURLLoader::loaderWithLoading(loading), places);
   _prolog->setRemarks(std::move(remarks));
   // Local variable IDs of the main body start at 1.
   _prolog->setNextLocalVariableID(1);

@@ -12,20 +12,20 @@ Ref<NSString> XQueryExpr::description() const {
   return NSString::stringWithASCII("<XQueryExpr>");
 }
 
-void XQueryCatchRaised(XQueryContext& context) {
-  context._internal().failAsRaised();
+void XQueryCatchRaised(XQueryContext& context, const XQueryExpr& expr) {
+  context._internal().failAsRaised(expr.exprPlace());
 }
 
-void XQueryCatchFailure(XQueryContext& context) {
+void XQueryCatchFailure(XQueryContext& context, const XQueryExpr& expr) {
   auto& dynamic = context._internal();
   try {
     throw;
   } catch (const std::bad_alloc&) {
-    dynamic.failForWantOfMemory();
+    dynamic.failForWantOfMemory(expr.exprPlace());
   } catch (const std::length_error&) {
     // Only decimals throw it.
     dynamic.setError(XQueryErrors::tooManyDigits.error(), false);
-    dynamic.failAsRaised();
+    dynamic.failAsRaised(expr.exprPlace());
   }
 }
 

@@ -16,6 +16,7 @@
 // recursion of a million frames would take seconds to end.
 #pragma once
 
+#include "Platform/Base/XQueryPlaces.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
@@ -35,7 +36,12 @@ class XQueryExpr : public NSCounted {
 
   // Line of the expression's first token, counted from 0; 0 until set.
   int64_t exprLine() const { return _line; }
-  void setExprLine(int64_t line) { _line = line; }
+  void setExprLine(int64_t line) { _line = static_cast<int32_t>(line); }
+  // Where it stands, from its first character to its last one, in the table of its program; 0 for
+  // what no text says by itself. The line of an operator is that of its sign, its place begins with
+  // its left operand.
+  XQueryPlaceNumber exprPlace() const { return _place; }
+  void setExprPlace(XQueryPlaceNumber place) { _place = place; }
 
   // Problems are added to the prolog's errors, never thrown.
   virtual void bindInfoForProlog(XQueryProlog& prolog) = 0;
@@ -52,23 +58,27 @@ class XQueryExpr : public NSCounted {
   virtual Ref<NSString> description() const;
 
  protected:
-  explicit XQueryExpr(Kind kind, int64_t initWithLine = 0) : NSCounted(kind), _line(initWithLine) {}
+  explicit XQueryExpr(Kind kind, int64_t initWithLine = 0, XQueryPlaceNumber place = 0)
+      : NSCounted(kind), _line(static_cast<int32_t>(initWithLine)), _place(place) {}
 
-  int64_t _line;
+  int32_t _line;
+
+ private:
+  XQueryPlaceNumber _place;
 };
 
-// Make an exception that an expression let out an error on its way out. The second one, to be
-// called by the handler, throws on what stands for no error of the query.
-[[gnu::cold]] void XQueryCatchRaised(XQueryContext& context);
-[[gnu::cold]] void XQueryCatchFailure(XQueryContext& context);
+// Make an exception that an expression let out an error on its way out, which arose there. The
+// second one, to be called by the handler, throws on what stands for no error of the query.
+[[gnu::cold]] void XQueryCatchRaised(XQueryContext& context, const XQueryExpr& expr);
+[[gnu::cold]] void XQueryCatchFailure(XQueryContext& context, const XQueryExpr& expr);
 
 inline Value XQueryExpr::evaluateWithContext(XQueryContext& context) const {
   try {
     return computeValue(context);
   } catch (const NSException&) {
-    XQueryCatchRaised(context);
+    XQueryCatchRaised(context, *this);
   } catch (const std::exception&) {
-    XQueryCatchFailure(context);
+    XQueryCatchFailure(context, *this);
   }
   return {};
 }

@@ -67,7 +67,9 @@ Value XQueryVariable::computeValue(XQueryContext& context) const {
   } else if (_qName) {
     value = dynamic.globalForQName(*_qName);
   }
-  if (!value) return dynamic.fail(XQueryErrors::undefinedVariable.errorAtLine(exprLine(), _name));
+  if (!value)
+    return dynamic.fail(XQueryErrors::undefinedVariable.errorAtLine(exprLine(), _name),
+                        exprPlace());
   return value;
 }
 
@@ -114,7 +116,7 @@ Ref<XQueryQName> XQueryQNameReference::qNameForContext(XQueryContext& context) c
       return XQueryQName::qname(_localPart, URI);
     }
   }
-  dynamic.raise(XQueryErrors::unresolvedQName.errorAtLine(exprLine(), _name));
+  dynamic.raise(XQueryErrors::unresolvedQName.errorAtLine(exprLine(), _name), exprPlace());
 }
 
 }  // namespace xquery

@@ -120,9 +120,17 @@ Value XQueryFunctionCall::callDeclared(XQueryContext& context) const {
   const CalleeFrame calleeFrame(dynamic, std::move(frame));
   const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
   Value result = _functionDecl->expr()->evaluateWithContext(context);
-  if (!result) return dynamic.isFailing() ? Value() : failUndefined(context);
-  if (auto* error = dyn_cast<XQueryError>(result)) return dynamic.fail(error);
+  if (!result || isa<XQueryError>(result)) return failInBody(result, context);
   return result;
+}
+
+// Passes on what the body failed with, or fails for what it gave instead of a value.
+Value XQueryFunctionCall::failInBody(const Value& result, XQueryContext& context) const {
+  auto& dynamic = context._internal();
+  if (auto* error = dyn_cast<XQueryError>(result)) dynamic.fail(error, exprPlace());
+  if (!dynamic.isFailing()) return failUndefined(context);
+  dynamic.failThroughCall(exprPlace(), _name.get());
+  return {};
 }
 
 bool XQueryFunctionCall::hasBody() const {
@@ -139,7 +147,7 @@ bool XQueryFunctionCall::askBody(const std::function<bool(const XQueryExpr& body
   const CalleeFrame calleeFrame(dynamic, std::move(frame));
   const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
   if (ask(*_functionDecl->expr())) return true;
-  if (!dynamic.isFailing()) failUndefined(context);
+  failInBody(nullptr, context);
   return false;
 }
 
@@ -157,7 +165,9 @@ Value XQueryFunctionCall::evaluatePartOfBody(const XQueryExpr& part,
   auto& dynamic = context._internal();
   const CalleeFrame calleeFrame(dynamic, std::move(frame));
   const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
-  return part.evaluateWithContext(context);
+  Value result = part.evaluateWithContext(context);
+  if (XQueryHasFailed(result, context)) dynamic.failThroughCall(exprPlace(), _name.get());
+  return result;
 }
 
 Value XQueryFunctionCall::callBuiltIn(XQueryContext& context) const {
@@ -191,16 +201,18 @@ Value XQueryFunctionCall::callBuiltInWith(const Value* arguments, size_t count,
   const CalleeFrame calleeFrame(dynamic, nullptr);
   Value result = normalised(_function(arguments, count, context));
   if (!result) return failInvalidArguments(context);
-  if (auto* error = dyn_cast<XQueryError>(result)) return dynamic.fail(error);
+  if (auto* error = dyn_cast<XQueryError>(result)) return dynamic.fail(error, exprPlace());
   return result;
 }
 
 Value XQueryFunctionCall::failUndefined(XQueryContext& context) const {
-  return context._internal().fail(XQueryErrors::undefinedFunction.errorAtLine(exprLine(), _name));
+  return context._internal().fail(XQueryErrors::undefinedFunction.errorAtLine(exprLine(), _name),
+                                  exprPlace());
 }
 
 Value XQueryFunctionCall::failInvalidArguments(XQueryContext& context) const {
-  return context._internal().fail(XQueryErrors::invalidArguments.errorAtLine(exprLine(), _name));
+  return context._internal().fail(XQueryErrors::invalidArguments.errorAtLine(exprLine(), _name),
+                                  exprPlace());
 }
 
 }  // namespace xquery

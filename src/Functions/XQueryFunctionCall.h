@@ -75,6 +75,7 @@ class XQueryFunctionCall : public XQueryExpr {
   Value callBuiltIn(XQueryContext& context) const;
   Value callBuiltIn(Value* arguments, size_t count, XQueryContext& context) const;
   // Out of line: what they need of the stack is no part of a recursion's frames.
+  [[gnu::noinline, gnu::cold]] Value failInBody(const Value& result, XQueryContext& context) const;
   [[gnu::noinline, gnu::cold]] Value failUndefined(XQueryContext& context) const;
 
   Ref<NSString> _name;

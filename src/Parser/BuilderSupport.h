@@ -14,10 +14,19 @@ Ref<T> XQRef(NSObject* object) {
   return Ref<T>(cast<T>(object));
 }
 
+// Says of an expression that it is what the production at work stands for. One that grows from
+// production to production has the place of the last.
+inline NSObject* XQPlace(NSObject* expr) {
+  XQueryParser& parser = *XQueryParser::currentParser();
+  parser.setPlace(*cast<XQueryExpr>(expr), parser.span());
+  return expr;
+}
+
 // Hands an expression to the pool, with its line.
 template <class T>
 NSObject* XQAtLine(Ref<T> expr, int64_t line) {
   expr->setExprLine(line);
+  XQPlace(expr.get());
   return XQueryParserAutoRelease(std::move(expr));
 }
 

@@ -171,8 +171,10 @@ NSObject* XQCdataSection(NSObject* text, int64_t line) {
 
 NSObject* XQXmlComment(NSObject* text, int64_t line) {
   if (const auto comment = XQueryXMLNodeComment(*textOf(text))) return XQNodeLiteral(comment, line);
-  return XQAtLine(XQueryLiteral::literalWithValue(XQueryErrors::invalidComment.errorAtLine(line)),
-                  line);
+  // Answered as a value, which is told as an error wherever somebody looks at it.
+  Ref<XQueryLiteral> literal = XQueryLiteral::literalWithValue(
+      XQueryParser::currentParser()->placed(XQueryErrors::invalidComment.errorAtLine(line)));
+  return XQAtLine(std::move(literal), line);
 }
 
 NSObject* XQXmlPI(NSObject* target, NSObject* content, int64_t line) {

@@ -59,8 +59,17 @@ int operatorCode(int token) {
 // A literal of more digits than a decimal holds is an error of the query, never another number.
 NSObject* XQDigits(Ref<XQueryLiteral> literal, int64_t line) {
   if (literal) return XQAtLine(std::move(literal), line);
-  XQueryParser::currentParser()->setError(XQueryErrors::tooManyDigits.errorAtLine(line));
+  XQueryParser& parser = *XQueryParser::currentParser();
+  parser.setError(XQueryErrors::tooManyDigits.errorAtLine(line), parser.span());
   return XQEmptyLiteral(line);
+}
+
+// An operator ends with its right operand and begins with its left one, which the production at
+// work begins with.
+void XQExtendToStart(XQueryOperatorExpr& expr) {
+  XQueryParser& parser = *XQueryParser::currentParser();
+  const uint32_t end = parser.places()->span(expr.exprPlace()).end;
+  parser.setPlace(expr, {parser.span().start, end});
 }
 
 }  // namespace
@@ -73,7 +82,7 @@ NSObject* XQExpr(NSObject* expr, int64_t line) {
 
 NSObject* XQExprAdd(NSObject* list, NSObject* expr) {
   cast<XQueryExprList>(list)->addObject(XQRef<XQueryExpr>(expr));
-  return list;
+  return XQPlace(list);
 }
 
 NSObject* XQFLWRExpr(NSObject* clauses, NSObject* whereExpr, NSObject* orderSpecs,
@@ -148,7 +157,7 @@ NSObject* XQOrderSpec(NSObject* expr, NSObject* modifier, int64_t line) {
   auto* spec = cast<XQueryOrderSpec>(modifier);
   spec->setExpr(XQRef<XQueryExpr>(expr));
   spec->setExprLine(line);
-  return spec;
+  return XQPlace(spec);
 }
 
 NSObject* XQOrderModifier(bool ascending, XQueryOrderSpec::EmptyOrder emptyOrder,
@@ -222,7 +231,11 @@ NSObject* XQOperatorSetLeft(NSObject* chain, NSObject* left) {
   // this once per operator with a chain of one, and once per chain with its first operand, so
   // walking the chain costs no more than building it.
   XQueryOperatorExpr* end = cast<XQueryOperatorExpr>(chain);
-  while (end->left()) end = cast<XQueryOperatorExpr>(end->left());
+  XQExtendToStart(*end);
+  while (end->left()) {
+    end = cast<XQueryOperatorExpr>(end->left());
+    XQExtendToStart(*end);
+  }
   end->setLeftExpr(XQRef<XQueryExpr>(left));
   return chain;
 }
@@ -295,7 +308,7 @@ NSObject* XQFunctionArgs(NSObject* expr) {
 
 NSObject* XQFunctionArgsAdd(NSObject* args, NSObject* expr) {
   cast<XQueryArgs>(args)->addObject(XQRef<XQueryExpr>(expr));
-  return args;
+  return XQPlace(args);
 }
 
 NSObject* XQValidateExpr(int64_t line) {

@@ -9,6 +9,13 @@ XQueryPrologItemLocations locationsOf(NSObject* list) {
   return XQVector<NSString>(list);
 }
 
+// Hands a declaration to the pool, with its place.
+template <class Item>
+NSObject* XQItem(Ref<Item> item) {
+  XQueryParser::currentParser()->setPlace(*item);
+  return XQueryParserAutoRelease(std::move(item));
+}
+
 }  // namespace
 
 NSObject* XQMainModule(NSObject* version, NSObject* prologItems, NSObject* body) {
@@ -28,8 +35,8 @@ NSObject* XQVersion(NSObject* version) {
 }
 
 NSObject* XQModuleNamespace(NSObject* prefix, NSObject* URI, int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemModuleNamespace::moduleNamespace(
-      XQRef<NSString>(URI), XQRef<NSString>(prefix), line));
+  return XQItem(XQueryPrologItemModuleNamespace::moduleNamespace(XQRef<NSString>(URI),
+                                                                 XQRef<NSString>(prefix), line));
 }
 
 NSObject* XQProlog(NSObject* setters, NSObject* nonSetters) {
@@ -47,84 +54,81 @@ NSObject* XQPrologItemsAppend(NSObject* items, NSObject* itemOrItems) {
 
 NSObject* XQVariableDeclaration(NSObject* name, NSObject* type, NSObject* expr, bool isExternal,
                                 int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemVariableDeclaration::variable(
+  return XQItem(XQueryPrologItemVariableDeclaration::variable(
       XQRef<NSString>(name), XQRef<XQueryTypeDeclaration>(type), XQRef<XQueryExpr>(expr),
       isExternal, line));
 }
 
 NSObject* XQXMLSpacePreserve(bool preserve, int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemXMLSpacePerserve::preserve(preserve, line));
+  return XQItem(XQueryPrologItemXMLSpacePerserve::preserve(preserve, line));
 }
 
 NSObject* XQOrdered(bool ordered, int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemOrdered::ordered(ordered, line));
+  return XQItem(XQueryPrologItemOrdered::ordered(ordered, line));
 }
 
 NSObject* XQDeclareConstructionPreserve(bool preserve, int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemConstructionPerserve::preserve(preserve, line));
+  return XQItem(XQueryPrologItemConstructionPerserve::preserve(preserve, line));
 }
 
 NSObject* XQDeclareDefaultOrderEmptyLeast(bool emptyLeast, int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemDefaultOrder::emptyLeast(emptyLeast, line));
+  return XQItem(XQueryPrologItemDefaultOrder::emptyLeast(emptyLeast, line));
 }
 
 NSObject* XQDeclareInheritNamespaces(bool inherit, int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemInheritNamespaces::inherit(inherit, line));
+  return XQItem(XQueryPrologItemInheritNamespaces::inherit(inherit, line));
 }
 
 NSObject* XQDeclareDefaultCollation(NSObject* URI, int64_t line) {
   XQRemark(XQueryRemark::Matter::DefaultCollation, line, URI);
-  return XQueryParserAutoRelease(
-      XQueryPrologItemDefaultCollation::collation(XQRef<NSString>(URI), line));
+  return XQItem(XQueryPrologItemDefaultCollation::collation(XQRef<NSString>(URI), line));
 }
 
 NSObject* XQDeclareDefaultBaseURI(NSObject* URI, int64_t line) {
   XQRemark(XQueryRemark::Matter::BaseURI, line, URI);
-  return XQueryParserAutoRelease(
-      XQueryPrologItemDefaultBaseURI::baseURI(XQRef<NSString>(URI), line));
+  return XQItem(XQueryPrologItemDefaultBaseURI::baseURI(XQRef<NSString>(URI), line));
 }
 
 NSObject* XQDeclareNamespace(NSObject* prefix, NSObject* URI, int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemDeclareNamespace::declareNamespace(
-      XQRef<NSString>(URI), XQRef<NSString>(prefix), line));
+  return XQItem(XQueryPrologItemDeclareNamespace::declareNamespace(XQRef<NSString>(URI),
+                                                                   XQRef<NSString>(prefix), line));
 }
 
 NSObject* XQDeclareDefaultElementNamespace(NSObject* URI, int64_t line) {
-  return XQueryParserAutoRelease(
+  return XQItem(
       XQueryPrologItemDefaultElementNamespace::elementNamespace(XQRef<NSString>(URI), line));
 }
 
 NSObject* XQDeclareDefaultFunctionNamespace(NSObject* URI, int64_t line) {
-  return XQueryParserAutoRelease(
+  return XQItem(
       XQueryPrologItemDefaultFunctionNamespace::functionNamespace(XQRef<NSString>(URI), line));
 }
 
 NSObject* XQFunctionDecl(NSObject* name, NSObject* params, NSObject* type, NSObject* expr,
                          bool isExternal, int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemFunctionDeclaration::function(
+  return XQItem(XQueryPrologItemFunctionDeclaration::function(
       XQRef<NSString>(name), XQVector<XQueryParam>(params), XQRef<XQueryTypeDeclaration>(type),
       XQRef<XQueryExpr>(expr), isExternal, line));
 }
 
 NSObject* XQDeclareValidationSchemaMode(int32_t mode, int64_t line) {
-  return XQueryParserAutoRelease(
-      XQueryPrologItemDeclareValidationSchemaMode::schemaMode(mode, line));
+  return XQItem(XQueryPrologItemDeclareValidationSchemaMode::schemaMode(mode, line));
 }
 
 NSObject* XQModuleImport(NSObject* URI, NSObject* locations, NSObject* prefix, int64_t line) {
-  return XQueryParserAutoRelease(XQueryPrologItemModuleImport::moduleImport(
+  return XQItem(XQueryPrologItemModuleImport::moduleImport(
       XQRef<NSString>(URI), locationsOf(locations), XQRef<NSString>(prefix), line));
 }
 
 NSObject* XQSchemaImport(NSObject* URI, NSObject* locations, NSObject* prefix, int64_t line) {
   XQRemark(XQueryRemark::Matter::SchemaImport, line, URI);
-  return XQueryParserAutoRelease(XQueryPrologItemSchemaImport::schemaImport(
+  return XQItem(XQueryPrologItemSchemaImport::schemaImport(
       XQRef<NSString>(URI), locationsOf(locations), XQRef<NSString>(prefix), line));
 }
 
 NSObject* XQSchemaImportDefaultElement(NSObject* URI, NSObject* locations, int64_t line) {
   XQRemark(XQueryRemark::Matter::SchemaImport, line, URI);
-  return XQueryParserAutoRelease(XQueryPrologItemSchemaImportDefaultElement::defaultElement(
+  return XQItem(XQueryPrologItemSchemaImportDefaultElement::defaultElement(
       XQRef<NSString>(URI), locationsOf(locations), line));
 }
 

@@ -102,6 +102,10 @@ XQueryScannedWord scanName(int state, std::string_view rest) {
   return {.length = length, .token = rule->token, .name = name, .next = rule->next};
 }
 
+bool startsCharacter(char byte) {
+  return (static_cast<unsigned char>(byte) & 0xC0) != 0x80;
+}
+
 // Bytes of the character at the start of well-formed UTF-8.
 size_t characterLength(std::string_view text) {
   const auto byte = static_cast<unsigned char>(text[0]);
@@ -122,6 +126,10 @@ void XQueryScanner::resetActions() {
   _extensionContent = {};
   _isAtEnd = false;
   _hasFailed = false;
+  _literalStart.reset();
+  _span = {};
+  _countedBytes = 0;
+  _countedCharacters = 0;
 }
 
 void XQueryScanner::XQScanStateSet(int state) {
@@ -156,6 +164,8 @@ int XQueryScanner::errorToken(const std::string& message, int line, size_t place
   const int currentLine = _line;
   _line = line;
   _errorPlace = place;
+  // What is not terminated goes on to the end, and any other error is about the token.
+  _span = spanOf(place, _isAtEnd ? tokenStart() : tokenStart() + tokenText().size());
   SetTokenValues(kTokenError, line, XQueryParserSting(message), tokenText());
   _errorPlace.reset();
   _line = currentLine;
@@ -165,8 +175,21 @@ int XQueryScanner::errorToken(const std::string& message, int line, size_t place
 int64_t XQueryScanner::column() const {
   const std::string_view before(_input, _errorPlace ? *_errorPlace : tokenPlace());
   const std::string_view inLine = before.substr(before.rfind('\n') + 1);
-  return std::count_if(inLine.begin(), inLine.end(),
-                       [](char byte) { return (static_cast<unsigned char>(byte) & 0xC0) != 0x80; });
+  return std::count_if(inLine.begin(), inLine.end(), startsCharacter);
+}
+
+// Characters are counted on from the place that was asked for last, which few are before.
+XQuerySpan XQueryScanner::spanOf(size_t start, size_t end) {
+  const auto countedTo = [this](size_t place) {
+    if (place < _countedBytes) _countedBytes = _countedCharacters = 0;
+    const std::string_view text(_input + _countedBytes, place - _countedBytes);
+    _countedCharacters +=
+        static_cast<uint32_t>(std::count_if(text.begin(), text.end(), startsCharacter));
+    _countedBytes = place;
+    return _countedCharacters;
+  };
+  const uint32_t first = countedTo(start);
+  return {first, countedTo(std::max(start, end))};
 }
 
 void XQueryScanner::noteLiteralSource() {
@@ -195,6 +218,7 @@ void XQueryScanner::XQScannerStringLiteralStart(int tokenCode) {
   _stringLiteralToken = tokenCode;
   _stringLiteralLine = _line;
   _stringLiteralPlace = tokenPlace();
+  _stringLiteralStart = tokenStart();
 }
 
 int XQueryScanner::symbol(int token) {
@@ -304,6 +328,7 @@ int XQueryScanner::literalClose() {
   noteLiteralSource();
   XQScanStatePop();
   NSString* value = XQueryParserAutoRelease(_stringLiteral.string());
+  _literalStart = _stringLiteralStart;
   return SetTokenValues(_stringLiteralToken, _stringLiteralLine, value, _stringLiteralSource);
 }
 

@@ -14,12 +14,17 @@
 %parse-param {xquery::XQueryParser& parser}
 %lex-param {xquery::XQueryParser& parser}
 %define api.value.type {xquery::XQueryTokenValue}
+%define api.location.type {xquery::XQueryLocation}
+%locations
 %define parse.trace
 %token-table
 %expect 3
 
 %code requires {
 #include "Parser/XQueryTokenValue.h"
+
+/* Both are copied bytewise. */
+#define XQLTYPE_IS_TRIVIAL 1
 
 namespace xquery {
 class XQueryParser;
@@ -41,6 +46,7 @@ class XQueryParser;
 }
 
 %code {
+#include "Expr/Paths/XQueryPath.h"
 #include "Parser/Builders.h"
 #include "Parser/XQueryScanner.h"
 #include "Parser/XQueryTokens.h"
@@ -49,7 +55,7 @@ using namespace xquery;
 
 /* The generator's two messages in the words that users of the engine know. What the scanner has
    complained of is not complained of again. */
-static void XQReport(XQueryParser& parser, std::string_view message) {
+static void XQReport(const XQueryLocation*, XQueryParser& parser, std::string_view message) {
   if (parser.scanner().hasFailed()) return;
   if (message == "syntax error") message = "parse error";
   if (message == "memory exhausted") message = "parser stack overflow";
@@ -61,13 +67,45 @@ static void XQReport(XQueryParser& parser, std::string_view message) {
 #define yyerror XQReport
 #define XQerror XQtokentype::XQerror
 
-static int XQlex(XQSTYPE* value, XQueryParser& parser) { return parser.scanner().XQlex(*value); }
+static int XQlex(XQSTYPE* value, XQueryLocation* location, XQueryParser& parser) {
+  const int token = parser.scanner().XQlex(*value);
+  location->span = parser.scanner().span();
+  return token;
+}
+
+/* A production stands for the text from its first symbol to its last one, an empty one for that
+   behind the symbol before it. The builders that its action calls learn of it from the parser. */
+static XQueryLocation XQProduction(XQueryParser& parser, const XQueryLocation* symbols,
+                                   int count) {
+  const uint32_t start = count > 0 ? symbols[1].span.start : symbols[0].span.end;
+  const XQuerySpan span{start, symbols[count].span.end};
+  parser.setSpan(span);
+  return XQueryLocation(span);
+}
+#define YYLOCATION_PRINT(out, location) \
+  fprintf(out, "%u-%u", (location)->span.start, (location)->span.end)
+#define YYLLOC_DEFAULT(current, symbols, count) \
+  ((current) = XQProduction(parser, &YYRHSLOC(symbols, 0), count))
 
 static XQSTYPE XQValue(int32_t line, NSObject* value) {
   XQSTYPE result = {};
   result.line = line;
   result.value = value;
   return result;
+}
+
+/* An expression that is only a piece of what its production stands for. */
+static NSObject* XQPiece(XQueryParser& parser, const XQueryLocation& first,
+                         const XQueryLocation& last, NSObject* expr) {
+  parser.setPlace(*cast<XQueryExpr>(expr), {first.span.start, last.span.end});
+  return expr;
+}
+
+/* The step that a path begins with which begins with a slash, or two. */
+static NSObject* XQRoot(XQueryParser& parser, const XQueryLocation& slash) {
+  NSObject* const step = XQueryFilterStepRoot();
+  XQPiece(parser, slash, slash, cast<XQueryStep>(step)->expr());
+  return step;
 }
 
 static XQSTYPE XQUnit(int32_t line, char16_t unit) {
@@ -770,13 +808,15 @@ TypeswitchExpr:
         kTokenVarName kTokenReturn ExprSingle
       {
         $$ = XQValue($1.line, XQTypeswitchExpr($2.value, XQCaseClausesAdd($4.value,
-            XQCaseClause($7.value, nullptr, $9.value, $5.line)), $1.line));
+            XQPiece(parser, @5, @9, XQCaseClause($7.value, nullptr, $9.value, $5.line))),
+            $1.line));
       }
   | kTokenTypeswitchParenLeft Expr kTokenParenRight CaseClauses kTokenDefault kTokenReturn
         ExprSingle
       {
         $$ = XQValue($1.line, XQTypeswitchExpr($2.value, XQCaseClausesAdd($4.value,
-            XQCaseClause(nullptr, nullptr, $7.value, $5.line)), $1.line));
+            XQPiece(parser, @5, @7, XQCaseClause(nullptr, nullptr, $7.value, $5.line))),
+            $1.line));
       }
   ;
 
@@ -995,14 +1035,15 @@ PathExpr:
 PathStart:
     kTokenSolidusSolidus StepExpr
       {
-        NSObject* anyNodes = XQNodeTest(XQAnyKindTest($1.line), kTokenDescendantOrSelfColonColon);
+        NSObject* test = XQPiece(parser, @1, @1, XQAnyKindTest($1.line));
+        NSObject* anyNodes = XQNodeTest(test, kTokenDescendantOrSelfColonColon);
         NSObject* steps = XQRelativePathItemSetNext(anyNodes, $2.value);
-        $$ = XQValue($1.line, XQRelativePathItemSetNext(XQueryFilterStepRoot(), steps));
+        $$ = XQValue($1.line, XQRelativePathItemSetNext(XQRoot(parser, @1), steps));
       }
   | kTokenSolidus StepExpr
-      { $$ = XQValue($1.line, XQRelativePathItemSetNext(XQueryFilterStepRoot(), $2.value)); }
+      { $$ = XQValue($1.line, XQRelativePathItemSetNext(XQRoot(parser, @1), $2.value)); }
   | kTokenSolidus
-      { $$ = XQValue($1.line, XQueryFilterStepRoot()); }
+      { $$ = XQValue($1.line, XQRoot(parser, @1)); }
   | StepExpr
   ;
 
@@ -1015,7 +1056,8 @@ PathItems:
 PathItem:
     kTokenSolidusSolidus StepExpr
       {
-        NSObject* anyNodes = XQNodeTest(XQAnyKindTest($1.line), kTokenDescendantOrSelfColonColon);
+        NSObject* test = XQPiece(parser, @1, @1, XQAnyKindTest($1.line));
+        NSObject* anyNodes = XQNodeTest(test, kTokenDescendantOrSelfColonColon);
         $$ = XQValue($1.line, XQRelativePathItemSetNext(anyNodes, $2.value));
       }
   | kTokenSolidus StepExpr
@@ -1389,13 +1431,13 @@ CompElemConstructor:
 CompAttrConsructor:
     kTokenAttributeQNameCurlyBraceLeft Expr kTokenCurlyBraceRight
       {
-        $$ = XQValue($1.line, XQCompAttrConsructor(XQStringLiteral($1.value, $1.line), $2.value,
-            $1.line));
+        NSObject* name = XQPiece(parser, @1, @1, XQStringLiteral($1.value, $1.line));
+        $$ = XQValue($1.line, XQCompAttrConsructor(name, $2.value, $1.line));
       }
   | kTokenAttributeQNameCurlyBraceLeft kTokenCurlyBraceRight
       {
-        $$ = XQValue($1.line, XQCompAttrConsructor(XQStringLiteral($1.value, $1.line), nullptr,
-            $1.line));
+        NSObject* name = XQPiece(parser, @1, @1, XQStringLiteral($1.value, $1.line));
+        $$ = XQValue($1.line, XQCompAttrConsructor(name, nullptr, $1.line));
       }
   | kTokenAttributeCurlyBraceLeft Expr kTokenCurlyBraceRight kTokenCurlyBraceLeft Expr
         kTokenCurlyBraceRight
@@ -1408,10 +1450,14 @@ CompAttrConsructor:
 CompXmlPI:
     kTokenPINCNameCurlyBraceLeft Expr kTokenCurlyBraceRight
       {
-        $$ = XQValue($1.line, XQComputedPI(XQStringLiteral($1.value, $1.line), $2.value, $1.line));
+        NSObject* name = XQPiece(parser, @1, @1, XQStringLiteral($1.value, $1.line));
+        $$ = XQValue($1.line, XQComputedPI(name, $2.value, $1.line));
       }
   | kTokenPINCNameCurlyBraceLeft kTokenCurlyBraceRight
-      { $$ = XQValue($1.line, XQComputedPI(XQStringLiteral($1.value, $1.line), nullptr, $1.line)); }
+      {
+        NSObject* name = XQPiece(parser, @1, @1, XQStringLiteral($1.value, $1.line));
+        $$ = XQValue($1.line, XQComputedPI(name, nullptr, $1.line));
+      }
   | kTokenPICurlyBraceLeft Expr kTokenCurlyBraceRight kTokenCurlyBraceLeft Expr
         kTokenCurlyBraceRight
       { $$ = XQValue($1.line, XQComputedPI($2.value, $5.value, $1.line)); }
@@ -1496,8 +1542,8 @@ SchemaElementTest:
     kTokenSchemaElementParenLeft kTokenQName kTokenParenRight
       {
         XQSchemaTest($2.value, $1.line);
-        $$ = XQValue($1.line, XQElementTest(XQNodeName($2.value, $2.line), nullptr, false,
-            $1.line));
+        NSObject* name = XQPiece(parser, @2, @2, XQNodeName($2.value, $2.line));
+        $$ = XQValue($1.line, XQElementTest(name, nullptr, false, $1.line));
       }
   ;
 
@@ -1514,7 +1560,8 @@ SchemaAttributeTest:
     kTokenSchemaAttributeParenLeft kTokenQName kTokenParenRight
       {
         XQSchemaTest($2.value, $1.line);
-        $$ = XQValue($1.line, XQAttributeTest(XQNodeName($2.value, $2.line), nullptr, $1.line));
+        NSObject* name = XQPiece(parser, @2, @2, XQNodeName($2.value, $2.line));
+        $$ = XQValue($1.line, XQAttributeTest(name, nullptr, $1.line));
       }
   ;
 

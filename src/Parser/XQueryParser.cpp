@@ -4,6 +4,7 @@
 #include "Parser/XQueryTokens.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Base/XQueryErrorTrace.h"
 #include "Types/XQueryErrors.h"
 
 #include <algorithm>
@@ -54,7 +55,8 @@ void logAndRecord(const XQueryErrorText<places>& row, const Parts&... parts) {
   const Ref<NSString> text = row.message(parts..., sourceLine);
   logText(text);
   sXQueryParserCurrent->setError(
-      XQueryError::error(row.number, text, scanner.line(), sourceLine, scanner.column()));
+      XQueryError::error(row.number, text, scanner.line(), sourceLine, scanner.column()),
+      scanner.span());
 }
 
 // A carriage return, with the line feed behind it if there is one, is one line feed.
@@ -91,18 +93,46 @@ XQueryParser::Session::~Session() {
   sXQueryParserCurrent = _around;
 }
 
-Ref<XQueryParser> XQueryParser::unparsedParserWithSource(Ref<NSString> source) {
-  return make<XQueryParser>(std::move(source));
+XQueryParser::XQueryParser(Ref<NSString> initWithSource, Ref<NSString> URL,
+                           Ref<XQueryPlaces> places)
+    : NSCounted(Kind::Internal),
+      _source(std::move(initWithSource)),
+      _places(places ? std::move(places) : XQueryPlaces::places()) {
+  _places->beginModule(_source, std::move(URL));
 }
 
-Ref<XQueryParser> XQueryParser::parserWithSource(Ref<NSString> source) {
-  Ref<XQueryParser> parser = unparsedParserWithSource(std::move(source));
+Ref<XQueryParser> XQueryParser::unparsedParserWithSource(Ref<NSString> source, Ref<NSString> URL,
+                                                         Ref<XQueryPlaces> places) {
+  return make<XQueryParser>(std::move(source), std::move(URL), std::move(places));
+}
+
+Ref<XQueryParser> XQueryParser::parserWithSource(Ref<NSString> source, Ref<NSString> URL,
+                                                 Ref<XQueryPlaces> places) {
+  Ref<XQueryParser> parser =
+      unparsedParserWithSource(std::move(source), std::move(URL), std::move(places));
   parser->parse();
   return parser;
 }
 
 XQueryParser* XQueryParser::currentParser() {
   return sXQueryParserCurrent;
+}
+
+void XQueryParser::setError(Ref<XQueryError> error, std::optional<XQuerySpan> at) {
+  _errors.push_back(at ? placed(error, *at) : std::move(error));
+}
+
+Ref<XQueryError> XQueryParser::placed(const Ref<XQueryError>& error, XQuerySpan at) {
+  return XQueryError::_errorWithTrace(*error,
+                                      XQueryErrorTrace::traceInPlaces(_places, _places->add(at)));
+}
+
+void XQueryParser::setPlace(XQueryExpr& expr, XQuerySpan span) {
+  if (expr.exprPlace() == 0) {
+    expr.setExprPlace(_places->add(span));
+  } else {
+    _places->change(expr.exprPlace(), span);
+  }
 }
 
 void XQueryParser::parse() {
@@ -224,7 +254,10 @@ void XQueryFatalError(const char* message) {
 }
 
 void XQueryParserExtension(const Ref<NSString>& name, const Ref<NSString>& content, int64_t line) {
-  record(XQueryErrors::mustUnderstandExtension.errorAtLine(line, name, content));
+  XQueryParser& parser = *sXQueryParserCurrent;
+  const auto error = XQueryErrors::mustUnderstandExtension.errorAtLine(line, name, content);
+  parser.setError(error, parser.scanner().extensionSpan());
+  logText(error->msg());
 }
 
 void XQueryParserPragma(const Ref<NSString>&, const Ref<NSString>&, int64_t) {}
@@ -232,14 +265,15 @@ void XQueryParserPragma(const Ref<NSString>&, const Ref<NSString>&, int64_t) {}
 void XQueryParser::XQueryParserSetSetterFlag(unsigned flag, int64_t line) {
   for (const SetterError& row : setterErrors) {
     if (row.flag != flag) continue;
-    if (_setterFlags & flag) setError(row.text.errorAtLine(line));
+    if (_setterFlags & flag) setError(row.text.errorAtLine(line), _span);
     _setterFlags |= flag;
     return;
   }
 }
 
-XQueryParse XQueryParseModule(const Ref<NSString>& source) {
-  const auto parser = XQueryParser::parserWithSource(source);
+XQueryParse XQueryParseModule(const Ref<NSString>& source, const Ref<NSString>& URL,
+                              const Ref<XQueryPlaces>& places) {
+  const auto parser = XQueryParser::parserWithSource(source, URL, places);
   return {parser->parsedModule(), parser->errors()};
 }
 

@@ -8,6 +8,7 @@
 
 #include "Parser/XQueryScanner.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Base/XQueryPlaces.h"
 #include "Prolog/XQueryParsedModule.h"
 #include "xquery/Error.h"
 #include "xquery/Object.h"
@@ -15,6 +16,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -36,8 +38,11 @@ enum XQuerySetterFlag : unsigned {
 class XQueryParser : public NSCounted {
  public:
   // Parses at once: a parser is read-only afterwards. A compilation has failed when there are
-  // errors, whatever module there is.
-  [[nodiscard]] static Ref<XQueryParser> parserWithSource(Ref<NSString> source);
+  // errors, whatever module there is. The places of what it makes are added to those of a module at
+  // that URL, which may be null; without any given they have a table of their own.
+  [[nodiscard]] static Ref<XQueryParser> parserWithSource(Ref<NSString> source,
+                                                          Ref<NSString> URL = nullptr,
+                                                          Ref<XQueryPlaces> places = nullptr);
 
   // Null when parsing failed, and for a query of nothing but white space and comments.
   const Ref<XQueryParsedModule>& parsedModule() const { return _parsedModule; }
@@ -45,7 +50,9 @@ class XQueryParser : public NSCounted {
   const Ref<NSString>& source() const { return _source; }
   // The line of the source, counted from 0; the empty string outside.
   Ref<NSString> sourceLine(int64_t index) const;
-  void setError(Ref<XQueryError> error) { _errors.push_back(std::move(error)); }
+  const Ref<XQueryPlaces>& places() const { return _places; }
+  // Without the second argument the place is not known.
+  void setError(Ref<XQueryError> error, std::optional<XQuerySpan> at = std::nullopt);
   // That of this thread; null outside a parse.
   static XQueryParser* currentParser();
 
@@ -61,6 +68,15 @@ class XQueryParser : public NSCounted {
   void setResult(NSObject* module) { _result = module; }
   // Notes what the expressions will not tell.
   void remark(XQueryRemark remark) { _remarks.push_back(std::move(remark)); }
+  // What the production that is at work stands for.
+  void setSpan(XQuerySpan span) { _span = span; }
+  XQuerySpan span() const { return _span; }
+  // The error, known to have arisen there.
+  Ref<XQueryError> placed(const Ref<XQueryError>& error) { return placed(error, _span); }
+  Ref<XQueryError> placed(const Ref<XQueryError>& error, XQuerySpan at);
+  // Gives the expression or prolog item that place, instead of one that it has.
+  void setPlace(XQueryExpr& expr, XQuerySpan span);
+  void setPlace(XQueryPrologItem& item) { item.setPlace(_places->add(_span)); }
   // The second declaration of one kind is an error at its line; an unknown flag is ignored.
   void XQueryParserSetSetterFlag(unsigned flag, int64_t line);
   // Keeps the object alive until the parse ends. One token may complete any number of expressions,
@@ -85,11 +101,11 @@ class XQueryParser : public NSCounted {
     XQueryParser* const _around;  // the one that was current before
   };
   // A parser that has not parsed, for driving the scanner alone.
-  [[nodiscard]] static Ref<XQueryParser> unparsedParserWithSource(Ref<NSString> source);
+  [[nodiscard]] static Ref<XQueryParser> unparsedParserWithSource(
+      Ref<NSString> source, Ref<NSString> URL = nullptr, Ref<XQueryPlaces> places = nullptr);
 
  protected:
-  explicit XQueryParser(Ref<NSString> initWithSource)
-      : NSCounted(Kind::Internal), _source(std::move(initWithSource)) {}
+  XQueryParser(Ref<NSString> initWithSource, Ref<NSString> URL, Ref<XQueryPlaces> places);
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
@@ -111,6 +127,8 @@ class XQueryParser : public NSCounted {
   bool _hasUTF8String = false;
   unsigned _setterFlags = 0;
   XQueryRemarks _remarks;
+  Ref<XQueryPlaces> _places;
+  XQuerySpan _span;
   NSObject* _result = nullptr;  // owned by the pool
   std::unique_ptr<XQueryScanner> _scanner;
   Counted<Value> _pool;

@@ -9,6 +9,7 @@
 #pragma once
 
 #include "Parser/XQueryTokenValue.h"
+#include "Platform/Base/XQueryPlaces.h"
 #include "xquery/String.h"
 
 #include <cstddef>
@@ -71,6 +72,11 @@ class XQueryScanner {
   // Characters before the current token in its line; a token of several lines counts as beginning
   // with the last of them. For an error, those before what it is about.
   int64_t column() const;
+  // Where the last token stands, of a literal from its opening quote; for an error what that is
+  // about.
+  XQuerySpan span() const { return _span; }
+  // From "(::" to the end of the current token, which ends the extension.
+  XQuerySpan extensionSpan() { return spanOf(_commentPlace, tokenStart() + tokenText().size()); }
   // The text of the current token; empty at the end of the input.
   std::string_view tokenText() const;
   // Whether it came upon what is no token.
@@ -125,6 +131,8 @@ class XQueryScanner {
   int finishToken(const XQueryTokenValue& record);
   int errorToken(const std::string& message, int line, size_t place);
   size_t tokenPlace() const;
+  size_t tokenStart() const;
+  XQuerySpan spanOf(size_t start, size_t end);
   void noteLiteralSource();
   void enterState(int state);
   void resetActions();
@@ -137,7 +145,12 @@ class XQueryScanner {
   XQueryTokenValue* _value = nullptr;
   int _line = 0;
   // Places count in bytes from the start of the input.
-  std::optional<size_t> _errorPlace;  // while an error is recorded
+  std::optional<size_t> _errorPlace;    // while an error is recorded
+  std::optional<size_t> _literalStart;  // of the literal that is the token
+  XQuerySpan _span;
+  // How many characters there are up to the last place that was asked for.
+  size_t _countedBytes = 0;
+  uint32_t _countedCharacters = 0;
   int _state = XQueryStateINITIAL;
   int _startState = XQueryStateDEFAULT;
   std::vector<uint8_t> _stateStack;
@@ -148,6 +161,7 @@ class XQueryScanner {
   int _stringLiteralToken = 0;
   int _stringLiteralLine = 0;
   size_t _stringLiteralPlace = 0;
+  size_t _stringLiteralStart = 0;
   std::string _stringLiteralSource;  // only while token sources are logged
   // Lines of the last "(:" and of the last "pragma" or "extension".
   int _commentLine = 0;

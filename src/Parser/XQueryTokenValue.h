@@ -6,6 +6,7 @@
 // drained at the end of the parse.
 #pragma once
 
+#include "Platform/Base/XQueryPlaces.h"
 #include "xquery/Object.h"
 
 #include <cstdint>
@@ -20,6 +21,16 @@ struct XQueryTokenValue {
     char16_t unit;    // of the character-valued tokens
   };
   NSObject* source;  // the raw text of the token, only while token sources are logged
+};
+
+// Where a symbol on the grammar's stack stands. It is copied bytewise as well. The generated parser
+// begins with a location of four numbers, which are line and column of start and end to it.
+struct XQueryLocation {
+  XQueryLocation() = default;
+  XQueryLocation(int, int, int, int) : span() {}
+  explicit XQueryLocation(XQuerySpan at) : span(at) {}
+
+  XQuerySpan span;
 };
 
 }  // namespace xquery

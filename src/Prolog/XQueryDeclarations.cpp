@@ -30,7 +30,7 @@ Ref<XQueryParam> XQueryParam::paramWithName(Ref<NSString> name, Ref<XQueryTypeDe
 void XQueryParam::bindInfoForProlog(XQueryProlog& prolog) {
   if (const auto qName = prolog.variableQNameFromString(_name)) {
     if (prolog.localVariableIDForQName(qName) != 0) {
-      prolog.addError(XQueryErrors::duplicateParameter.error());
+      prolog.addError(XQueryErrors::duplicateParameter.error(), exprPlace());
     } else {
       _varID = prolog.newLocalVariableIDForQName(qName);
     }

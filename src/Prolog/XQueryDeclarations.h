@@ -42,6 +42,9 @@ class XQueryVarDecl : public NSCounted {
     _writtenName = std::move(name);
     _line = line;
   }
+  // That of the declaration.
+  XQueryPlaceNumber place() const { return _place; }
+  void setPlace(XQueryPlaceNumber place) { _place = place; }
 
  protected:
   XQueryVarDecl(Ref<XQueryQName> name, Ref<XQueryTypeDeclaration> type, Ref<XQueryExpr> expr,
@@ -56,6 +59,7 @@ class XQueryVarDecl : public NSCounted {
   XQueryProlog& _prolog;
   Ref<NSString> _writtenName;
   int64_t _line = 0;
+  XQueryPlaceNumber _place = 0;
 };
 
 // A parameter of a declared function.
@@ -115,6 +119,9 @@ class XQueryFunctionDecl : public NSCounted {
     _writtenName = std::move(name);
     _line = line;
   }
+  // That of the declaration.
+  XQueryPlaceNumber place() const { return _place; }
+  void setPlace(XQueryPlaceNumber place) { _place = place; }
 
  protected:
   XQueryFunctionDecl(Ref<XQueryQName> name, Ref<XQueryTypeDeclaration> type,
@@ -131,6 +138,7 @@ class XQueryFunctionDecl : public NSCounted {
   XQueryProlog& _prolog;
   Ref<NSString> _writtenName;
   int64_t _line = 0;
+  XQueryPlaceNumber _place = 0;
 };
 
 }  // namespace xquery

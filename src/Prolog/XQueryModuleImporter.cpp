@@ -37,7 +37,7 @@ void XQueryModuleImporter::resolve(Importer& importer) {
   if (importer.nextLocation == 0) {
     const int64_t id = prolog.namespaceID(item.namespaceString());
     if (const XQueryProlog* module = prolog.modules().prologForID(id)) {
-      prolog._importDeclarations(*module);
+      prolog._importDeclarations(*module, item.place());
       return goOn(importer);
     }
   }
@@ -46,7 +46,7 @@ void XQueryModuleImporter::resolve(Importer& importer) {
     return tryLocation(importer, (*locations)[importer.nextLocation++]);
   }
   const auto fail = [&] {
-    prolog.addError(XQueryErrors::moduleNotFound.error(item.description()));
+    prolog.addError(XQueryErrors::moduleNotFound.error(item.description()), item.place());
   };
   fail();
   // Without any location clause the failure is recorded twice.
@@ -61,7 +61,7 @@ void XQueryModuleImporter::tryLocation(Importer& importer, const Ref<NSString>& 
   const auto URL = importer.prolog->URLForLocation(location);
   const auto source = URL ? modules.sourceAtURL(URL) : Ref<NSString>();
   if (!source) return;
-  const auto [module, errors] = XQueryParseModule(source);
+  const auto [module, errors] = XQueryParseModule(source, URL->absoluteString(), modules.places());
   if (!errors.empty()) return noteReasons(importer, errors, *URL);
   if (!module) return;
   auto prolog = make<XQueryProlog>(Ref<XQueryModules>(&modules));
@@ -80,7 +80,8 @@ void XQueryModuleImporter::finish() {
     return noteReasons(importer, prolog->errors(), *prolog->moduleURL());
   }
   if (!prolog->isModule()) return;
-  importer.prolog->_importDeclarations(*prolog);
+  const XQueryPrologItem& item = *importer.prolog->moduleImports()[importer.import];
+  importer.prolog->_importDeclarations(*prolog, item.place());
   goOn(importer);
 }
 

@@ -6,6 +6,7 @@
 // replaced under its ID is kept as well, for others may have copied its declarations by then.
 #pragma once
 
+#include "Platform/Base/XQueryPlaces.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/StringTable.h"
 #include "xquery/Object.h"
@@ -51,6 +52,10 @@ class XQueryModules : public NSCounted {
   void addProlog(Ref<XQueryProlog> prolog, int64_t forID);
   void removePrologs();
 
+  // Where the expressions of all modules of the compilation stand.
+  const Ref<XQueryPlaces>& places() const { return _places; }
+  void setPlaces(Ref<XQueryPlaces> places) { _places = std::move(places); }
+
   // The text behind a URL. Null when the URL is relative, when it may not or cannot be read, when
   // it is not UTF-8, and once the compilation has asked for as many as it may.
   Ref<NSString> sourceAtURL(const Ref<NSURL>& URL);
@@ -68,6 +73,7 @@ class XQueryModules : public NSCounted {
   StringTable<int64_t> _namespaceIDs;      // the same namespaces
   std::vector<XQueryProlog*> _prologs;     // by ID
   std::vector<Ref<XQueryProlog>> _ownedPrologs;
+  Ref<XQueryPlaces> _places = XQueryPlaces::places();
   Ref<NSURLLoader> _loader;  // null when nothing may be loaded any more
   uint32_t _sourceCount = 0;
 };

@@ -54,7 +54,9 @@ struct XQueryParse {
   std::vector<Ref<XQueryError>> errors;
 };
 
-// Parses a text. The parser is in a room above this one and answers there.
-[[nodiscard]] XQueryParse XQueryParseModule(const Ref<NSString>& source);
+// Parses the text behind a URL, and adds the places of its expressions to the others. The parser is
+// in a room above this one and answers there.
+[[nodiscard]] XQueryParse XQueryParseModule(const Ref<NSString>& source, const Ref<NSString>& URL,
+                                            const Ref<XQueryPlaces>& places);
 
 }  // namespace xquery

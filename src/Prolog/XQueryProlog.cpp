@@ -5,6 +5,7 @@
 
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Base/XQueryErrorTrace.h"
 #include "Platform/Loading/NSURLLoader.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryModuleImporter.h"
@@ -89,12 +90,13 @@ Ref<XQueryProlog> XQueryProlog::prologWithItems(const std::vector<Ref<XQueryProl
                                                 Ref<NSString> atLocation,
                                                 Ref<XQueryModules> forModules,
                                                 const Ref<NSString>& version,
-                                                Ref<NSURLLoader> loader) {
+                                                Ref<NSURLLoader> loader, Ref<XQueryPlaces> places) {
   Ref<NSURL> moduleURL;
   if (loader) {
     moduleURL = NSURL::URLWithString(NSString::stringWithUTF8(loader->loading().moduleURL));
   }
   auto prolog = make<XQueryProlog>(std::move(forModules), std::move(loader));
+  if (places) prolog->_modules->setPlaces(std::move(places));
   prolog->_start(items, std::move(atLocation), version, std::move(moduleURL));
   XQueryModuleImporter().build(prolog);
   if (prolog->_madeModules) prolog->_modules->endLoading();
@@ -144,7 +146,11 @@ void XQueryProlog::_addItems(const std::vector<Ref<XQueryPrologItem>>& items) {
   }
 }
 
-void XQueryProlog::addError(Ref<XQueryError> error) {
+void XQueryProlog::addError(Ref<XQueryError> error, XQueryPlaceNumber at) {
+  if (at != 0 && !XQueryErrorTrace::of(*error)) {
+    error = XQueryError::_errorWithTrace(*error,
+                                         XQueryErrorTrace::traceInPlaces(_modules->places(), at));
+  }
   _errors.push_back(std::move(error));
 }
 

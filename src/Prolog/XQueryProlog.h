@@ -1,6 +1,7 @@
 // The static context of one module.
 #pragma once
 
+#include "Platform/Base/XQueryPlaces.h"
 #include "Prolog/StringTable.h"
 #include "Prolog/XQueryNamespaceStack.h"
 #include "Prolog/XQueryRemark.h"
@@ -54,13 +55,13 @@ class XQueryProlog : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Prolog; }
 
-  // `modules` null makes a new registry, which fetches what is imported through the loader, or
-  // through one with the settings that a compilation starts with; `location` and `version` may be
-  // null.
+  // `places` are those of the expressions that the parser made, where it did. `modules` null makes
+  // a new registry, which fetches what is imported through the loader, or through one with the
+  // settings that a compilation starts with; `location` and `version` may be null.
   [[nodiscard]] static Ref<XQueryProlog> prologWithItems(
       const std::vector<Ref<XQueryPrologItem>>& items, Ref<NSString> atLocation,
       Ref<XQueryModules> forModules, const Ref<NSString>& version,
-      Ref<NSURLLoader> loader = nullptr);
+      Ref<NSURLLoader> loader = nullptr, Ref<XQueryPlaces> places = nullptr);
 
   XQueryModules& modules() const { return *_modules; }
   bool xmlSpacePreserve() const { return _xmlSpacePreserve; }
@@ -151,7 +152,8 @@ class XQueryProlog : public NSCounted {
   Ref<XQueryQName> functionQNameFromString(const Ref<NSString>& name) const;
   Ref<XQueryQName> xmlQNameFromString(const Ref<NSString>& name) const;
   void addQNameReference(Ref<XQueryExpr> reference);
-  void addError(Ref<XQueryError> error);
+  // An error that has a place already keeps it.
+  void addError(Ref<XQueryError> error, XQueryPlaceNumber at = 0);
 
   // --- setters, used by the prolog items ---------------------------------------------------------
   void setModulePrefix(Ref<NSString> prefix) { _modulePrefix = std::move(prefix); }
@@ -184,7 +186,8 @@ class XQueryProlog : public NSCounted {
 
  private:
   void removePrefix(const Ref<NSString>& prefix, int64_t fromBuiltinID);
-  void _importDeclarations(const XQueryProlog& module);
+  // `at` is where the import stands.
+  void _importDeclarations(const XQueryProlog& module, XQueryPlaceNumber at);
   void bindDeclaration(NSObject& declaration);
   void _addItems(const std::vector<Ref<XQueryPrologItem>>& items);
   // The first part of the building: before the imports.

@@ -64,7 +64,7 @@ void XQueryProlog::restoreLocalScope(const LocalScope& scope) {
 
 // Copies what the module declared in its own namespace, and nothing that it imported itself. A
 // module that imports itself finds each of its names taken, so the walk never sees its own growth.
-void XQueryProlog::_importDeclarations(const XQueryProlog& module) {
+void XQueryProlog::_importDeclarations(const XQueryProlog& module, XQueryPlaceNumber at) {
   // Each name of each import may be an error: of two short texts more than any memory holds.
   constexpr size_t mostErrors = 100'000;
   if (!module.isModule()) return;
@@ -82,7 +82,7 @@ void XQueryProlog::_importDeclarations(const XQueryProlog& module) {
       const auto& name = variable->name();
       if (!isOwn(*name)) continue;
       if (variableInfoForQName(name)) {
-        addError(XQueryErrors::duplicateVariable.error(name->XQueryStringValue()));
+        addError(XQueryErrors::duplicateVariable.error(name->XQueryStringValue()), at);
       } else {
         setVariableInfo(variable, name);
       }
@@ -91,7 +91,7 @@ void XQueryProlog::_importDeclarations(const XQueryProlog& module) {
       if (!isOwn(*name)) continue;
       const XQueryFunctionSignature signature(name, function->params().size());
       if (functionInfoForSignature(signature)) {
-        addError(XQueryErrors::duplicateFunction.error(name->XQueryStringValue()));
+        addError(XQueryErrors::duplicateFunction.error(name->XQueryStringValue()), at);
       } else {
         setFunctionInfo(function, signature);
       }

@@ -26,7 +26,7 @@ Ref<NSString> joined(const XQueryPrologItemLocations& locations) {
 
 void addItemError(XQueryProlog& prolog, const XQueryErrorText<1>& text,
                   const XQueryPrologItem& item) {
-  prolog.addError(text.error(item.description()));
+  prolog.addError(text.error(item.description()), item.place());
 }
 
 // Registers the namespace of an import and its prefix; false for a prefix bound to another one.
@@ -103,7 +103,7 @@ void XQueryPrologItemDeclareNamespace::XQueryUpdateProlog(XQueryProlog& prolog) 
   if (boundID >= XQueryNamespaceFirstUser) {
     addItemError(prolog, XQueryErrors::prefixReused, *this);
   } else if (boundID == XQueryNamespaceXML || boundID == XQueryNamespaceXmlns) {
-    prolog.addError(XQueryErrors::reservedPrefix.error(_prefix));
+    prolog.addError(XQueryErrors::reservedPrefix.error(_prefix), place());
   } else {
     prolog.addNamespace(_namespaceString, _prefix);
   }
@@ -141,6 +141,7 @@ void XQueryPrologItemVariableDeclaration::XQueryUpdateProlog(XQueryProlog& prolo
   }
   auto declaration = XQueryVarDecl::varDecl(qName, _type, _expr, prolog);
   declaration->setWritten(_varName, line());
+  declaration->setPlace(place());
   prolog.setVariableInfo(std::move(declaration), qName);
 }
 
@@ -172,6 +173,7 @@ void XQueryPrologItemFunctionDeclaration::XQueryUpdateProlog(XQueryProlog& prolo
   }
   auto declaration = XQueryFunctionDecl::functionDecl(qName, _type, _paramList, _expr, prolog);
   declaration->setWritten(_name, line());
+  declaration->setPlace(place());
   prolog.setFunctionInfo(std::move(declaration), signature);
 }
 

@@ -29,6 +29,9 @@ class XQueryPrologItem : public NSCounted {
 
   // The source line, counted from 0.
   int64_t line() const { return _line; }
+  // Where the declaration stands, without its semicolon.
+  XQueryPlaceNumber place() const { return _place; }
+  void setPlace(XQueryPlaceNumber place) { _place = place; }
   virtual void XQueryUpdateProlog(XQueryProlog& prolog) = 0;
   // For diagnostics, and part of several error messages.
   virtual Ref<NSString> description() const = 0;
@@ -38,6 +41,7 @@ class XQueryPrologItem : public NSCounted {
 
  private:
   int64_t _line;
+  XQueryPlaceNumber _place = 0;
 };
 
 // Makes the prolog that of a library module.

@@ -20,11 +20,13 @@ namespace xquery {
 
 template <size_t places = 0>
 struct XQueryErrorText {
+  XQueryErrorCategory category;
   int64_t number;
   std::string_view text;  // ASCII
 
-  consteval XQueryErrorText(int64_t withNumber, std::string_view withText)
-      : number(withNumber), text(withText) {
+  consteval XQueryErrorText(XQueryErrorCategory ofCategory, int64_t withNumber,
+                            std::string_view withText)
+      : category(ofCategory), number(withNumber), text(withText) {
     size_t found = 0;
     for (size_t at = text.find("%@"); at != text.npos; at = text.find("%@", at + 2)) ++found;
     if (found != places) throw "the text has another number of places to fill";
@@ -37,136 +39,146 @@ struct XQueryErrorText {
   template <class... Parts>
   requires(sizeof...(Parts) == places)
       [[nodiscard]] Ref<XQueryError> error(const Parts&... parts) const {
-    return XQueryError::error(number, message(parts...));
+    return XQueryError::error(category, number, message(parts...));
   }
   // The line counts from 0.
   template <class... Parts>
   requires(sizeof...(Parts) == places)
       [[nodiscard]] Ref<XQueryError> errorAtLine(int64_t line, const Parts&... parts) const {
-    return XQueryError::error(number, message(parts...), line);
+    return XQueryError::error(category, number, message(parts...), line);
   }
 };
 
 namespace XQueryErrors {
 
+using enum XQueryErrorCategory;
+
 // --- limits --------------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<> nestedTooDeeply{0, "limit: expression nested too deeply"};
-inline constexpr XQueryErrorText<> outOfMemory{0, "limit: out of memory"};
-inline constexpr XQueryErrorText<> deadlinePassed{0, "limit: deadline passed"};
-inline constexpr XQueryErrorText<> evaluationCancelled{0, "limit: evaluation cancelled"};
-inline constexpr XQueryErrorText<> memoryCeilingReached{0, "limit: memory ceiling reached"};
-inline constexpr XQueryErrorText<> tooManyDigits{0, "limit: number of too many digits"};
-inline constexpr XQueryErrorText<> rangeTooLong{0, "limit: range of too many items"};
+inline constexpr XQueryErrorText<> nestedTooDeeply{Limit, 0, "limit: expression nested too deeply"};
+inline constexpr XQueryErrorText<> outOfMemory{Limit, 0, "limit: out of memory"};
+inline constexpr XQueryErrorText<> deadlinePassed{Limit, 0, "limit: deadline passed"};
+inline constexpr XQueryErrorText<> evaluationCancelled{Limit, 0, "limit: evaluation cancelled"};
+inline constexpr XQueryErrorText<> memoryCeilingReached{Limit, 0, "limit: memory ceiling reached"};
+inline constexpr XQueryErrorText<> tooManyDigits{Limit, 0, "limit: number of too many digits"};
+inline constexpr XQueryErrorText<> rangeTooLong{Limit, 0, "limit: range of too many items"};
 
 // --- streams -------------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<1> notAStream{0, "cannot be evaluated as a stream: %@"};
-inline constexpr XQueryErrorText<> nodeOfAStreamKept{0, "a node of a stream is still referred to"};
+inline constexpr XQueryErrorText<1> notAStream{Internal, 0, "cannot be evaluated as a stream: %@"};
+inline constexpr XQueryErrorText<> nodeOfAStreamKept{Internal, 0,
+                                                     "a node of a stream is still referred to"};
 
 // --- parsing -------------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<> noSource{3, "there is no query text"};
-inline constexpr XQueryErrorText<> notUTF8{3, "the query is not well-formed UTF-8"};
-inline constexpr XQueryErrorText<2> scannerError{3, "%@ - %@"};
-inline constexpr XQueryErrorText<3> invalidToken{3, "%@ invalid token (%@)- %@"};
-inline constexpr XQueryErrorText<1> parserFailure{3, "%@"};
+inline constexpr XQueryErrorText<> noSource{Syntax, 3, "there is no query text"};
+inline constexpr XQueryErrorText<> notUTF8{Syntax, 3, "the query is not well-formed UTF-8"};
+inline constexpr XQueryErrorText<2> scannerError{Syntax, 3, "%@ - %@"};
+inline constexpr XQueryErrorText<3> invalidToken{Syntax, 3, "%@ invalid token (%@)- %@"};
+inline constexpr XQueryErrorText<1> parserFailure{Syntax, 3, "%@"};
 inline constexpr XQueryErrorText<2> mustUnderstandExtension{
-    14, "must-understand extension not supported (%@ %@)"};
+    Syntax, 14, "must-understand extension not supported (%@ %@)"};
 
 // --- the prolog ----------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<1> unsupportedVersion{31, "version \"%@\" not supported"};
-inline constexpr XQueryErrorText<1> baseURIDefined{32, "base-uri already defined for %@"};
+inline constexpr XQueryErrorText<1> unsupportedVersion{Syntax, 31, "version \"%@\" not supported"};
+inline constexpr XQueryErrorText<1> baseURIDefined{Syntax, 32, "base-uri already defined for %@"};
 inline constexpr XQueryErrorText<> secondBaseURI{
-    32, "Prolog contains more than one base URI declaration"};
-inline constexpr XQueryErrorText<1> prefixReused{33, "invalid resuse of prefix for %@"};
-inline constexpr XQueryErrorText<1> functionDeclaredTwice{34,
+    Syntax, 32, "Prolog contains more than one base URI declaration"};
+inline constexpr XQueryErrorText<1> prefixReused{Names, 33, "invalid resuse of prefix for %@"};
+inline constexpr XQueryErrorText<1> functionDeclaredTwice{Names, 34,
                                                           "invalid function declaration for %@"};
-inline constexpr XQueryErrorText<1> duplicateVariable{37, "duplicate definition of variable %@"};
-inline constexpr XQueryErrorText<1> duplicateFunction{37, "duplicate definition of function %@"};
+inline constexpr XQueryErrorText<1> duplicateVariable{Names, 37,
+                                                      "duplicate definition of variable %@"};
+inline constexpr XQueryErrorText<1> duplicateFunction{Names, 37,
+                                                      "duplicate definition of function %@"};
 inline constexpr XQueryErrorText<> secondDefaultCollation{
-    38, "Prolog contains more than one default collation declaration"};
-inline constexpr XQueryErrorText<> duplicateParameter{39,
+    Syntax, 38, "Prolog contains more than one default collation declaration"};
+inline constexpr XQueryErrorText<> duplicateParameter{Names, 39,
                                                       "more than one parameter with the same name"};
 inline constexpr XQueryErrorText<1> functionInReservedNamespace{
-    45, "invalid function declaration for %@"};
-inline constexpr XQueryErrorText<1> invalidNamespaceURI{46, "invalid namespace uri for %@"};
-inline constexpr XQueryErrorText<1> moduleNotFound{47, "can't access module for %@"};
-inline constexpr XQueryErrorText<1> variableOutsideModule{48,
+    Names, 45, "invalid function declaration for %@"};
+inline constexpr XQueryErrorText<1> invalidNamespaceURI{Names, 46, "invalid namespace uri for %@"};
+inline constexpr XQueryErrorText<1> moduleNotFound{Loading, 47, "can't access module for %@"};
+inline constexpr XQueryErrorText<1> variableOutsideModule{Names, 48,
                                                           "invalid variable declaration for %@"};
-inline constexpr XQueryErrorText<1> functionOutsideModule{48,
+inline constexpr XQueryErrorText<1> functionOutsideModule{Names, 48,
                                                           "invalid function declaration for %@"};
-inline constexpr XQueryErrorText<1> variableDeclaredTwice{49,
+inline constexpr XQueryErrorText<1> variableDeclaredTwice{Names, 49,
                                                           "invalid variable declaration for %@"};
 inline constexpr XQueryErrorText<> secondInheritNamespaces{
-    55, "Prolog contains more than one inherit-namespaces declaration"};
+    Syntax, 55, "Prolog contains more than one inherit-namespaces declaration"};
 inline constexpr XQueryErrorText<> secondOrderingMode{
-    65, "Prolog contains more than one ordering mode declaration"};
+    Syntax, 65, "Prolog contains more than one ordering mode declaration"};
 inline constexpr XQueryErrorText<> secondConstruction{
-    67, "Prolog contains more than one construction declaration"};
+    Syntax, 67, "Prolog contains more than one construction declaration"};
 inline constexpr XQueryErrorText<> secondXMLSpace{
-    68, "Prolog contains more than one xmlspace declaration"};
+    Syntax, 68, "Prolog contains more than one xmlspace declaration"};
 inline constexpr XQueryErrorText<> secondEmptyOrdering{
-    69, "Prolog contains more than one empty ordering declaration"};
-inline constexpr XQueryErrorText<1> reservedPrefix{70, "prefix %@ can't be redeclared"};
+    Syntax, 69, "Prolog contains more than one empty ordering declaration"};
+inline constexpr XQueryErrorText<1> reservedPrefix{Names, 70, "prefix %@ can't be redeclared"};
 
 // --- names and variables -------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<1> unresolvedQName{1, "can't resolve QName for \"%@\""};
-inline constexpr XQueryErrorText<1> undefinedVariable{8, "reference to undefined variable \"%@\""};
-inline constexpr XQueryErrorText<1> unresolvedExternalVariable{16,
+inline constexpr XQueryErrorText<1> unresolvedQName{Names, 1, "can't resolve QName for \"%@\""};
+inline constexpr XQueryErrorText<1> undefinedVariable{Names, 8,
+                                                      "reference to undefined variable \"%@\""};
+inline constexpr XQueryErrorText<1> unresolvedExternalVariable{Names, 16,
                                                                "unresloved external variable - %@"};
-inline constexpr XQueryErrorText<1> unresolvedExternalFunction{16,
+inline constexpr XQueryErrorText<1> unresolvedExternalFunction{Names, 16,
                                                                "unresloved external function - %@"};
 
 // --- types ---------------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<> invalidType{6, "invalid type"};
-inline constexpr XQueryErrorText<> invalidConversion{6, "invalid type conversion"};
-inline constexpr XQueryErrorText<> invalidOperand{6, "invalid type for operator"};
-inline constexpr XQueryErrorText<> invalidAtomization{6, "invalid type for automization"};
-inline constexpr XQueryErrorText<1> notAString{6, "not a string type - %@"};
-inline constexpr XQueryErrorText<1> notANumber{6, "not a numeric type - %@"};
-inline constexpr XQueryErrorText<1> notAnInteger{6, "not a integer type - %@"};
-inline constexpr XQueryErrorText<> valueOfAnotherType{6, "value does not match a required type"};
+inline constexpr XQueryErrorText<> invalidType{Types, 6, "invalid type"};
+inline constexpr XQueryErrorText<> invalidConversion{Types, 6, "invalid type conversion"};
+inline constexpr XQueryErrorText<> invalidOperand{Types, 6, "invalid type for operator"};
+inline constexpr XQueryErrorText<> invalidAtomization{Types, 6, "invalid type for automization"};
+inline constexpr XQueryErrorText<1> notAString{Types, 6, "not a string type - %@"};
+inline constexpr XQueryErrorText<1> notANumber{Types, 6, "not a numeric type - %@"};
+inline constexpr XQueryErrorText<1> notAnInteger{Types, 6, "not a integer type - %@"};
+inline constexpr XQueryErrorText<> valueOfAnotherType{Types, 6,
+                                                      "value does not match a required type"};
 
 // --- arithmetic ----------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<> divideByZero{6, "divide by zero"};
-inline constexpr XQueryErrorText<> divisionByZero{6, "Division by zero"};
+inline constexpr XQueryErrorText<> divideByZero{Values, 6, "divide by zero"};
+inline constexpr XQueryErrorText<> divisionByZero{Values, 6, "Division by zero"};
 
 // --- paths ---------------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<> itemNotANode{19, "item not a node"};
-inline constexpr XQueryErrorText<> itemNotAtomic{19, "item not an atomic typ"};
-inline constexpr XQueryErrorText<> itemNotANodeOrAtomic{19, "item not a node or atomic type"};
-inline constexpr XQueryErrorText<> contextItemNotANode{20, "context item not a node"};
+inline constexpr XQueryErrorText<> itemNotANode{Types, 19, "item not a node"};
+inline constexpr XQueryErrorText<> itemNotAtomic{Types, 19, "item not an atomic typ"};
+inline constexpr XQueryErrorText<> itemNotANodeOrAtomic{Types, 19,
+                                                        "item not a node or atomic type"};
+inline constexpr XQueryErrorText<> contextItemNotANode{Types, 20, "context item not a node"};
 
 // --- constructors --------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<> attributeNotDistinct{25, "Attribute name not distinct"};
+inline constexpr XQueryErrorText<> attributeNotDistinct{Values, 25, "Attribute name not distinct"};
 inline constexpr XQueryErrorText<> invalidInstruction{
-    26, "processing instruction content cannot contain ?>"};
-inline constexpr XQueryErrorText<> invalidDocumentNode{28, "invalid node for document"};
-inline constexpr XQueryErrorText<> attributeIsXMLNS{44, "Attribute namesapce is xmlns"};
-inline constexpr XQueryErrorText<> invalidNamespace{70, "invalid namespace declaration"};
-inline constexpr XQueryErrorText<> invalidComment{72, "invalid comment"};
+    Values, 26, "processing instruction content cannot contain ?>"};
+inline constexpr XQueryErrorText<> invalidDocumentNode{Values, 28, "invalid node for document"};
+inline constexpr XQueryErrorText<> attributeIsXMLNS{Values, 44, "Attribute namesapce is xmlns"};
+inline constexpr XQueryErrorText<> invalidNamespace{Values, 70, "invalid namespace declaration"};
+inline constexpr XQueryErrorText<> invalidComment{Values, 72, "invalid comment"};
 
 // --- function calls ------------------------------------------------------------------------------
 
-inline constexpr XQueryErrorText<1> undefinedFunction{8, "function %@ not defined for context"};
-inline constexpr XQueryErrorText<1> invalidArguments{17, "invalid arguments to function - %@"};
-inline constexpr XQueryErrorText<2> namedError{0, "%@#%@"};
-inline constexpr XQueryErrorText<3> describedError{0, "%@#%@ - %@"};
+inline constexpr XQueryErrorText<1> undefinedFunction{Names, 8,
+                                                      "function %@ not defined for context"};
+inline constexpr XQueryErrorText<1> invalidArguments{Types, 17,
+                                                     "invalid arguments to function - %@"};
+inline constexpr XQueryErrorText<2> namedError{RaisedByQuery, 0, "%@#%@"};
+inline constexpr XQueryErrorText<3> describedError{RaisedByQuery, 0, "%@#%@ - %@"};
 inline constexpr XQueryErrorText<> notZeroOrOne{
-    6, "fn:zero-or-one called with a sequence containing more than one item"};
+    Types, 6, "fn:zero-or-one called with a sequence containing more than one item"};
 inline constexpr XQueryErrorText<> notOneOrMore{
-    6, "fn:one-or-more called with a sequence containing zero items"};
+    Types, 6, "fn:one-or-more called with a sequence containing zero items"};
 inline constexpr XQueryErrorText<> notExactlyOne{
-    6, "fn:exactly-one called with a sequence containing zero or more than one item"};
+    Types, 6, "fn:exactly-one called with a sequence containing zero or more than one item"};
 inline constexpr XQueryErrorText<> unsupportedNormalizationForm{
-    0, "err:FOCH0003 - unsupported normalization form"};
+    Values, 0, "err:FOCH0003 - unsupported normalization form"};
 
 }  // namespace XQueryErrors
 }  // namespace xquery

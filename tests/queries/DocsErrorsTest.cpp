@@ -55,7 +55,7 @@ std::string replaced(std::string text, std::string_view from, std::string_view t
 }
 
 // The rows of the catalogue as the headings write them, read from its source: a row is
-// `name{NUMBER, "TEXT"};`, perhaps with the text on the next line.
+// `name{CATEGORY, NUMBER, "TEXT"};`, perhaps with the text on the next line.
 std::multiset<std::string> catalogue() {
   std::ifstream in(XQUERY_SOURCE_DIR "/src/Types/XQueryErrors.h");
   std::stringstream source;
@@ -64,7 +64,8 @@ std::multiset<std::string> catalogue() {
   std::multiset<std::string> rows;
   constexpr std::string_view start = "inline constexpr XQueryErrorText<";
   for (size_t at = 0; (at = text.find(start, at)) != text.npos; at += start.size()) {
-    const size_t number = text.find_first_not_of(" \n", text.find('{', at) + 1);
+    const size_t category = text.find('{', at) + 1;
+    const size_t number = text.find_first_not_of(" \n", text.find(',', category) + 1);
     const size_t open = text.find('"', number) + 1;
     const size_t close = text.find("\"};", open);
     const std::string row = text.substr(number, text.find(',', number) - number) + ": " +

@@ -4,6 +4,8 @@
 #include "Plan/Plan.h"
 #include "Plan/Program.h"
 #include "Plan/Rules/PlaceInside.h"
+#include "Platform/Base/XQueryErrorTrace.h"
+#include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 
@@ -14,8 +16,10 @@ namespace {
 // Told like an error of compiling, so of the module in which the place is.
 Ref<XQueryError> refusalOf(const XQueryProgram& program, const XQueryStreamPlan& plan,
                            const XQueryProlog& main) {
-  const auto error =
-      XQueryErrors::notAStream.errorAtLine(program[plan.refusedAt].expr->exprLine(), plan.reason);
+  const XQueryExpr& expr = *program[plan.refusedAt].expr;
+  const auto error = XQueryError::_errorWithTrace(
+      *XQueryErrors::notAStream.errorAtLine(expr.exprLine(), plan.reason),
+      XQueryErrorTrace::traceInPlaces(main.modules().places(), expr.exprPlace()));
   const XQueryProlog* prolog = program.bodyOf(plan.refusedAt).prolog;
   if (!prolog || prolog == &main || !prolog->moduleURL()) return error;
   return XQueryError::errorInModule(*error, prolog->moduleURL()->absoluteString());

@@ -50,7 +50,8 @@ Value XQueryConditionalExpr::computeValue(XQueryContext& context) const {
 
 // Out of line: what it needs of the stack is no part of a recursion's frames.
 Value XQueryConditionalExpr::failConversion(XQueryContext& context) const {
-  return context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
+  return context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()),
+                                  exprPlace());
 }
 
 }  // namespace xquery

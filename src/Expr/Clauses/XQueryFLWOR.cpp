@@ -130,7 +130,8 @@ void XQueryFLWORExpr::visitParts(XQueryPartVisitor& visitor) {
 bool XQueryFLWORExpr::isOfType(const XQueryBindingExpr& clause, const NSObject* value,
                                XQueryContext& context) const {
   if (!clause.type() || XQueryInstanceOf(value, *clause.type(), &context)) return true;
-  context._internal().fail(XQueryErrors::invalidType.errorAtLine(clause.exprLine()));
+  context._internal().fail(XQueryErrors::invalidType.errorAtLine(clause.exprLine()),
+                           clause.exprPlace());
   return false;
 }
 
@@ -342,7 +343,7 @@ Value XQueryFLWORExpr::firstItems(uint64_t most, XQueryContext& context) const {
 
   const XQueryOrderSpec& first = *_orderSpecs.front();
   if (!XQueryFLWORSortFirst(results.sortList, first.ascending(), first.emptyLeast(), most)) {
-    return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
+    return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()), exprPlace());
   }
   auto sorted = XQuerySequence::sequence();
   sorted->objects().reserve(results.sortList.items.size());

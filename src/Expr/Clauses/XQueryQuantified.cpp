@@ -51,7 +51,7 @@ void XQueryQuantifiedExpr::visitParts(XQueryPartVisitor& visitor) {
 Value XQueryQuantifiedExpr::computeValue(XQueryContext& context) const {
   Value answer = evaluatePostion(0, context);
   if (answer || context._internal().isFailing()) return answer;
-  return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
+  return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()), exprPlace());
 }
 
 Value XQueryQuantifiedExpr::evaluatePostion(size_t index, XQueryContext& withContext) const {
@@ -97,7 +97,8 @@ Value XQueryQuantifiedExpr::evaluateItem(size_t clause, size_t index, Value item
                                          XQueryContext& context) const {
   const XQueryQuantifiedExprItem& binding = *_items[clause];
   if (binding.type() && !XQueryInstanceOf(item.get(), *binding.type(), &context)) {
-    return XQueryErrors::invalidType.errorAtLine(binding.exprLine());
+    const auto error = XQueryErrors::invalidType.errorAtLine(binding.exprLine());
+    return context._internal().placed(error, binding.exprPlace());
   }
   context._internal().setVariable(std::move(item), binding.varID());
   return evaluatePostion(index + 1, context);

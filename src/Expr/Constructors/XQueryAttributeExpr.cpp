@@ -39,7 +39,7 @@ Ref<XQueryAttributeExpr> XQueryAttributeExpr::attributeExprWithName(
 
 void XQueryAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
-  _name.bind(prolog, Kind::Attribute, exprLine());
+  _name.bind(prolog, Kind::Attribute, *this);
   for (const auto& item : _items) item->bindInfoForProlog(prolog);
 }
 
@@ -90,7 +90,7 @@ Ref<XQueryComputedAttributeExpr> XQueryComputedAttributeExpr::computedAttributeE
 
 void XQueryComputedAttributeExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
-  _name.bind(prolog, Kind::Attribute, exprLine());
+  _name.bind(prolog, Kind::Attribute, *this);
   if (_value) _value->bindInfoForProlog(prolog);
 }
 

@@ -58,14 +58,16 @@ Ref<XQueryQName> XQueryConstructorName::resolved(const XQueryProlog& prolog, Kin
   return qName && qName->namespaceURI()->length() ? qName : nullptr;
 }
 
-void XQueryConstructorName::bindUnresolved(XQueryProlog& prolog, int64_t line) {
+void XQueryConstructorName::bindUnresolved(XQueryProlog& prolog, const XQueryExpr& constructor) {
+  const int64_t line = constructor.exprLine();
   if (prolog.isModule()) {
     auto error = XQueryErrors::unresolvedQName.errorAtLine(line, _name);
-    prolog.addError(error);
+    prolog.addError(error, constructor.exprPlace());
     _nameExpr = XQueryLiteral::literalWithValue(error);
     return;
   }
   auto reference = XQueryQNameReference::qNameReferenceWithString(_name, line);
+  reference->setExprPlace(constructor.exprPlace());
   prolog.addQNameReference(reference);
   _nameExpr = reference;
   if (hasPrefix(_name->view())) return;
@@ -82,16 +84,18 @@ void XQueryConstructorName::bindTarget() {
   if (XQueryIsNodeName(text->view())) _constant = NSXMLNameRef(text->view(), NSStringView());
 }
 
-void XQueryConstructorName::bind(XQueryProlog& prolog, Kind nodeKind, int64_t line) {
+void XQueryConstructorName::bind(XQueryProlog& prolog, Kind nodeKind,
+                                 const XQueryExpr& constructor) {
   _nodeKind = nodeKind;
   if (_nameExpr || !_name) {
     if (_nameExpr) _nameExpr->bindInfoForProlog(prolog);
     if (nodeKind == Kind::ProcessingInstruction) bindTarget();
   } else if (const Ref<XQueryQName> qName = resolved(prolog, nodeKind)) {
-    _nameExpr = XQueryQNameReference::qNameReferenceWithQName(qName, line);
+    _nameExpr = XQueryQNameReference::qNameReferenceWithQName(qName, constructor.exprLine());
+    _nameExpr->setExprPlace(constructor.exprPlace());
     _constant = nodeName(*qName);
   } else {
-    bindUnresolved(prolog, line);
+    bindUnresolved(prolog, constructor);
   }
 }
 

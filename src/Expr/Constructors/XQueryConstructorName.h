@@ -25,7 +25,8 @@ class XQueryConstructorName {
   // nearest enclosing constructor's default namespace before the prolog's; an attribute's is in no
   // namespace. A name that does not resolve is an error in a library module and waits for the
   // context's namespaces elsewhere.
-  void bind(XQueryProlog& prolog, Kind nodeKind, int64_t line);
+  // Line and place are those of the constructor.
+  void bind(XQueryProlog& prolog, Kind nodeKind, const XQueryExpr& constructor);
 
   // The expression, unless the name is a constant.
   void visitParts(XQueryPartVisitor& visitor);
@@ -37,7 +38,7 @@ class XQueryConstructorName {
  private:
   Ref<XQueryQName> resolved(const XQueryProlog& prolog, Kind nodeKind) const;
   void bindTarget();
-  void bindUnresolved(XQueryProlog& prolog, int64_t line);
+  void bindUnresolved(XQueryProlog& prolog, const XQueryExpr& constructor);
   bool isConstantIn(XQueryContext& context) const;
 
   Ref<NSString> _name;

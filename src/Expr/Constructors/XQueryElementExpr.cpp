@@ -87,7 +87,7 @@ void XQueryElementExpr::bindInfoForProlog(XQueryProlog& prolog) {
   collectNamespaces(_attributes, _namespaces);
   collectNamespaces(_items, _namespaces);
   if (!_namespaces.empty()) prolog.pushInScopeNamespaces(_namespaces);
-  _name.bind(prolog, Kind::Element, exprLine());
+  _name.bind(prolog, Kind::Element, *this);
   for (const auto& attribute : _attributes) attribute->bindInfoForProlog(prolog);
   for (const auto& item : _items) item->bindInfoForProlog(prolog);
   _roomBytes = roomBytes();

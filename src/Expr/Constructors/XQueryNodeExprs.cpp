@@ -69,7 +69,8 @@ Value XQueryCommentExpr::computeValue(XQueryContext& context) const {
   NSMutableString text;
   if (appendTextOf(_value, text, context) == Part::Failed) return {};
   if (const Ref<NSXMLNode> comment = XQueryXMLNodeComment(*text.string())) return comment;
-  return context._internal().fail(XQueryErrors::invalidComment.errorAtLine(exprLine()));
+  return context._internal().fail(XQueryErrors::invalidComment.errorAtLine(exprLine()),
+                                  exprPlace());
 }
 
 // --- processing instructions ---------------------------------------------------------------------
@@ -90,7 +91,7 @@ NSXMLNameRef XQueryProcessingInstructionExpr::targetNamed(const NSXMLNameRef& na
 
 void XQueryProcessingInstructionExpr::bindInfoForProlog(XQueryProlog& prolog) {
   if (!XQueryCheckStack(prolog)) return;
-  _name.bind(prolog, Kind::ProcessingInstruction, exprLine());
+  _name.bind(prolog, Kind::ProcessingInstruction, *this);
   bindPart(_value, prolog);
 }
 
@@ -107,11 +108,12 @@ Value XQueryProcessingInstructionExpr::computeValue(XQueryContext& context) cons
   NSMutableString content;
   if (appendTextOf(_value, content, context) == Part::Failed) return {};
   if (content.view().find(NSStringView::ascii("?>")) != NSStringView::notFound) {
-    return dynamic.fail(XQueryErrors::invalidInstruction.errorAtLine(exprLine()));
+    return dynamic.fail(XQueryErrors::invalidInstruction.errorAtLine(exprLine()), exprPlace());
   }
   const Ref<NSXMLNode> instruction =
       XQueryXMLNodePI(targetNamed(name), XQueryStringTrimLeadingWS(content.string())->view());
-  if (!instruction) return dynamic.fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
+  if (!instruction)
+    return dynamic.fail(XQueryErrors::invalidType.errorAtLine(exprLine()), exprPlace());
   dynamic.setBaseURI(dynamic.baseURI(), instruction.get());
   return instruction;
 }
@@ -163,7 +165,8 @@ void XQueryNamespaceExpr::visitParts(XQueryPartVisitor& visitor) {
 
 Value XQueryNamespaceExpr::computeValue(XQueryContext& context) const {
   if (_name->view() == "xml" || _name->view() == "xmlns") {
-    return context._internal().fail(XQueryErrors::invalidNamespace.errorAtLine(exprLine()));
+    return context._internal().fail(XQueryErrors::invalidNamespace.errorAtLine(exprLine()),
+                                    exprPlace());
   }
   NSMutableString URI;
   if (appendTextOf(_value, URI, context) == Part::Failed) return {};

@@ -6,6 +6,7 @@
 #include "Expr/Operators/XQueryArithmetic.h"
 #include "Expr/Operators/XQueryComparison.h"
 #include "Expr/Operators/XQueryRange.h"
+#include "Expr/XQueryAsking.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Expr/XQueryParts.h"
@@ -90,9 +91,10 @@ Value dispatch(int type, const Value& left, const Value& right, XQueryContext& c
 // line is none.
 [[gnu::cold]] Ref<XQueryError> errorFor(const Value& answer, int64_t line) {
   const auto* record = dyn_cast<XQueryError>(answer.get());
-  const int64_t number = record ? record->err() : XQueryErrors::invalidOperand.number;
-  const Ref<NSString> message = record ? record->msg() : XQueryErrors::invalidOperand.message();
-  return line < 0 ? XQueryError::error(number, message) : XQueryError::error(number, message, line);
+  constexpr auto& invalid = XQueryErrors::invalidOperand;
+  if (!record) return line < 0 ? invalid.error() : invalid.errorAtLine(line);
+  if (line < 0) return XQueryError::error(record->category(), record->err(), record->msg());
+  return XQueryError::error(record->category(), record->err(), record->msg(), line);
 }
 
 bool isFailure(const Value& answer) {
@@ -170,10 +172,13 @@ Value XQueryOperatorExpr::computeValue(XQueryContext& context) const {
 Value XQueryOperatorExpr::evaluateChain(XQueryContext& context) const {
   const LeftSpine<const XQueryOperatorExpr> spine(this);
   size_t index = spine.count() - 1;
-  Value value = spine[index]->evaluateAlone(context);
+  // What one of them raises has arisen there and not in the last one.
+  Value value =
+      XQueryAsk(*spine[index], context, [&] { return spine[index]->evaluateAlone(context); });
   while (index-- > 0) {
     if (XQueryHasFailed(value, context)) return {};
-    value = spine[index]->evaluateWithLeftValue(value, context);
+    const XQueryOperatorExpr& next = *spine[index];
+    value = XQueryAsk(next, context, [&] { return next.evaluateWithLeftValue(value, context); });
   }
   return value;
 }
@@ -214,7 +219,7 @@ Value XQueryOperatorExpr::answerFor(const Value& left, const Value& right,
   }
   Value answer = isSign() ? XQueryUnarySign(_type, right, context)
                           : dispatch(_type, leftOrEmpty(left), right, context);
-  if (isFailure(answer)) return context._internal().fail(errorFor(answer, _line));
+  if (isFailure(answer)) return context._internal().fail(errorFor(answer, _line), exprPlace());
   return answer;
 }
 
@@ -233,16 +238,18 @@ const XQueryOperatorExpr* XQueryOperatorExpr::rangeIn(const XQueryExpr* expr) {
 }
 
 XQueryRangeBounds XQueryOperatorExpr::rangeBounds(XQueryContext& context) const {
-  XQueryCheckStack(context);
-  const Value start = _left ? _left->evaluateWithContext(context) : Value();
-  if (XQueryHasFailed(start, context)) return {};
-  const Value end = _right->evaluateWithContext(context);
-  if (XQueryHasFailed(end, context)) return {};
-  XQueryRangeBounds bounds = XQueryRangeBoundsFrom(leftOrEmpty(start), end, context);
-  if (!bounds.areIntegers && isFailure(bounds.answer)) {
-    bounds.answer = context._internal().fail(errorFor(bounds.answer, _line));
-  }
-  return bounds;
+  return XQueryAsk(*this, context, [&]() -> XQueryRangeBounds {
+    XQueryCheckStack(context);
+    const Value start = _left ? _left->evaluateWithContext(context) : Value();
+    if (XQueryHasFailed(start, context)) return {};
+    const Value end = _right->evaluateWithContext(context);
+    if (XQueryHasFailed(end, context)) return {};
+    XQueryRangeBounds bounds = XQueryRangeBoundsFrom(leftOrEmpty(start), end, context);
+    if (!bounds.areIntegers && isFailure(bounds.answer)) {
+      bounds.answer = context._internal().fail(errorFor(bounds.answer, _line), exprPlace());
+    }
+    return bounds;
+  });
 }
 
 // Comparing with a range, as in ". = 1 to 1000", asks for its bounds only, where it can.

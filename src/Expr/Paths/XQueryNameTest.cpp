@@ -50,10 +50,11 @@ void XQueryNameTest::bindInfoForProlog(XQueryProlog& prolog) {
     return;
   }
   if (prolog.isModule()) {
-    prolog.addError(XQueryErrors::unresolvedQName.errorAtLine(_line, _name));
+    prolog.addError(XQueryErrors::unresolvedQName.errorAtLine(_line, _name), exprPlace());
     return;
   }
   auto reference = XQueryQNameReference::qNameReferenceWithString(_name, _line);
+  reference->setExprPlace(exprPlace());
   prolog.addQNameReference(reference);
   _qName = reference;
   Ref<NSString> prefix;
@@ -98,6 +99,7 @@ void XQueryWildCardNameTest::bindInfoForProlog(XQueryProlog& prolog) {
   name.append(_prefix->view());
   name.appendASCII(":*");
   auto reference = XQueryQNameReference::qNameReferenceWithString(name.string(), _line);
+  reference->setExprPlace(exprPlace());
   prolog.addQNameReference(reference);
   _qNameReference = reference;
 }

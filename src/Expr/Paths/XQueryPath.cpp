@@ -298,7 +298,8 @@ Ref<XQueryRootStepExpr> XQueryRootStepExpr::expr() {
 
 Value XQueryRootStepExpr::computeValue(XQueryContext& context) const {
   const auto* node = dyn_cast<NSXMLNode>(context._internal().contextItem());
-  if (!node) return context._internal().fail(XQueryErrors::contextItemNotANode.error());
+  if (!node)
+    return context._internal().fail(XQueryErrors::contextItemNotANode.error(), exprPlace());
   return XQueryTreatAs(node->rootNode(), *_type, context);
 }
 

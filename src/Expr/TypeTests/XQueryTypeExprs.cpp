@@ -72,7 +72,8 @@ Value XQueryCastExpr::computeValue(XQueryContext& context) const {
     result = castObject(value, _type->typeID(), context, allowEmpty);
   }
   if (result) return result;
-  return context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
+  return context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()),
+                                  exprPlace());
 }
 
 Ref<XQueryCastableExpr> XQueryCastableExpr::castableExpr(Ref<XQueryExpr> expr,
@@ -86,7 +87,7 @@ Value XQueryCastableExpr::computeValue(XQueryContext& context) const {
   if (XQueryHasFailed(value, context)) return {};
   // Several items are an error here, not merely not castable.
   if (_type->type() != XQueryTypeDeclaration::Atomic || isa<NSArray>(value)) {
-    return dynamic.fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()));
+    return dynamic.fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()), exprPlace());
   }
   try {
     const Value cast = XQueryCastExpr::castObject(value, _type->typeID(), context, true);

@@ -77,7 +77,7 @@ Value XQueryTypeswitchExpr::computeValue(XQueryContext& context) const {
   const XQueryCaseClauseExpr* clause = clauseFor(value.get(), context);
   Value result = clause ? evaluateClause(*clause, value, context) : Value();
   if (result || context._internal().isFailing()) return result;
-  return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()));
+  return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()), exprPlace());
 }
 
 }  // namespace xquery

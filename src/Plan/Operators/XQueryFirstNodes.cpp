@@ -1,13 +1,14 @@
 #include "Plan/Operators/XQueryFirstNodes.h"
 
 #include "Context/XQueryContextInternal.h"
+#include "Expr/XQueryAsking.h"
 
 namespace xquery {
 
 Value XQueryFirstNodes::computeValue(XQueryContext& context) const {
   // Diagnostics show every error that a predicate meets.
   if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
-  return _path->firstItems(_most, context);
+  return XQueryAsk(*_path, context, [&] { return _path->firstItems(_most, context); });
 }
 
 Value XQueryFirstTuples::computeValue(XQueryContext& context) const {

@@ -3,6 +3,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryFLWOR.h"
+#include "Expr/XQueryAsking.h"
 #include "Expr/XQueryLists.h"
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryFunctionCall.h"
@@ -22,16 +23,23 @@ const XQueryWalkedPath* countingPathIn(const XQueryExpr& expr) {
   return path->countsNodes() || (path->steps().empty() && path->picker()) ? path : nullptr;
 }
 
+std::optional<uint64_t> countItemsOfPath(const XQueryWalkedPath& path, uint64_t most,
+                                         XQueryContext& context) {
+  return XQueryAsk(path, context, [&] { return path.countItems(most, context); });
+}
+
 // A body that answers one error by itself makes the call fail.
 std::optional<uint64_t> countItemsOfCall(const XQueryFunctionCall& call, uint64_t most,
                                          XQueryContext& context) {
   std::optional<uint64_t> count;
   const auto ask = [&](const XQueryExpr& body) {
     const XQueryWalkedPath* path = countingPathIn(body);
-    if (path) count = path->countItems(most, context);
+    if (path) count = countItemsOfPath(*path, most, context);
     if (count || context._internal().isFailing()) return count.has_value();
     const Value items = body.evaluateWithContext(context);
-    if (auto* error = dyn_cast<XQueryError>(items)) context._internal().fail(error);
+    if (auto* error = dyn_cast<XQueryError>(items)) {
+      context._internal().fail(error, call.exprPlace());
+    }
     if (!items || context._internal().isFailing()) return false;
     count = XQueryItemList(items.get()).count();
     return true;
@@ -56,7 +64,7 @@ std::optional<uint64_t> countItemsOfList(const XQueryExprList& list, uint64_t mo
   for (size_t index = 0; index < list.count() && !tally.isComplete(); ++index) {
     const XQueryExpr& element = *list.objectAtIndex(index);
     if (const XQueryWalkedPath* path = pathOfNodesIn(element)) {
-      const auto count = path->countNodes(most, context);
+      const auto count = XQueryAsk(*path, context, [&] { return path->countNodes(most, context); });
       if (!count) return std::nullopt;
       tally.addItems(*count);
       continue;
@@ -70,12 +78,15 @@ std::optional<uint64_t> countItemsOfList(const XQueryExprList& list, uint64_t mo
 
 // None after an error, and where there is no value, as "." has none without a focus.
 std::optional<uint64_t> countItems(const XQueryExpr& expr, uint64_t most, XQueryContext& context) {
-  if (const auto* flwor = dyn_cast<XQueryFLWORExpr>(&expr)) return flwor->countItems(most, context);
+  if (const auto* flwor = dyn_cast<XQueryFLWORExpr>(&expr)) {
+    return XQueryAsk(expr, context, [&] { return flwor->countItems(most, context); });
+  }
   const auto* call = dyn_cast<XQueryFunctionCall>(&expr);
   if (call && call->hasBody()) return countItemsOfCall(*call, most, context);
   if (const auto* list = listWithCommas(expr)) return countItemsOfList(*list, most, context);
   const auto* planned = dyn_cast<XQueryPlannedExpr>(&expr);
-  if (planned && planned->walkedPath()) return planned->walkedPath()->countItems(most, context);
+  if (planned && planned->walkedPath())
+    return countItemsOfPath(*planned->walkedPath(), most, context);
   const Value items = expr.evaluateWithContext(context);
   if (!items) return std::nullopt;
   return XQueryItemList(items.get()).count();

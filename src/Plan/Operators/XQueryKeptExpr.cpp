@@ -118,7 +118,7 @@ class XQueryKeptExpr::Outcome final : public XQueryKeptValue {
           const XQueryContextInternal& context)
       : _value(std::move(value)), _assignments(std::move(assignments)) {
     if (_value || !context.isFailing()) return;
-    _error = context.error();
+    _error = context.tracedError();
     // A part of the focus that the evaluation has not set is, the next time, what it is then.
     const Focus left(context);
     if (left.item != before.item || left.position != before.position) {
@@ -135,7 +135,7 @@ class XQueryKeptExpr::Outcome final : public XQueryKeptValue {
     if (!_error) return _value;
     if (_setsItem) context.setContextItem(_item, _position);
     if (_setsLast) context.setLast(_last);
-    return context.fail(_error);
+    return context.fail(_error, 0);
   }
 
  private:

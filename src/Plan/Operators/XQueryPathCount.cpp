@@ -1,6 +1,7 @@
 #include "Plan/Operators/XQueryPathCount.h"
 
 #include "Context/XQueryContextInternal.h"
+#include "Expr/XQueryAsking.h"
 #include "Types/XQueryNumber.h"
 #include "xquery/Number.h"
 
@@ -44,7 +45,8 @@ Value XQueryPathCount::computeValue(XQueryContext& context) const {
   if (start && least > 0) return NSNumber::numberWithBool(holdsFrom(start));
   const uint64_t most = least == 0 ? UINT64_MAX : least;
   const auto count =
-      start ? std::optional(countFrom(start, most)) : _path->countNodes(most, context);
+      start ? std::optional(countFrom(start, most))
+            : XQueryAsk(*_path, context, [&] { return _path->countNodes(most, context); });
   return count ? _question.answer(*count) : Value();
 }
 

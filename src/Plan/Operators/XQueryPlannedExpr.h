@@ -32,7 +32,8 @@ class XQueryPlannedExpr : public XQueryExpr {
 
  protected:
   explicit XQueryPlannedExpr(Ref<XQueryExpr> plain)
-      : XQueryExpr(Kind::PlannedExpr, plain->exprLine()), _plain(std::move(plain)) {}
+      : XQueryExpr(Kind::PlannedExpr, plain->exprLine(), plain->exprPlace()),
+        _plain(std::move(plain)) {}
 
  private:
   Ref<XQueryExpr> _plain;

@@ -117,6 +117,7 @@ class Folding {
     if (!isSingleAtom(value)) return;
     auto literal = XQueryLiteral::literalWithValue(value);
     literal->setExprLine(at(place).expr->exprLine());
+    literal->setExprPlace(at(place).expr->exprPlace());
     _planning.replace(place, std::move(literal));
   }
 

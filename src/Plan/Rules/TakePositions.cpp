@@ -56,6 +56,7 @@ class Search {
     if (!isEqual || asked->number < 1) return false;
     auto number = XQueryLiteral::literalWithValue(XQueryNumber::integerWithInt64(asked->number));
     number->setExprLine(here.expr->exprLine());
+    number->setExprPlace(here.expr->exprPlace());
     _planning.replace(place, std::move(number));
     const_cast<XQueryPathExpr&>(path.path()).notePositions();
     return true;

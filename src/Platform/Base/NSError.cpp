@@ -1,4 +1,5 @@
 #include "Platform/Base/NSLog.h"
+#include "Platform/Base/XQueryErrorTrace.h"
 #include "xquery/Error.h"
 
 #include <string>
@@ -47,9 +48,10 @@ Ref<NSString> NSError::localizedDescription() const {
   return text.string();
 }
 
-XQueryError::XQueryError(int64_t number, Ref<NSString> msg, int64_t line, Ref<NSString> sourceLine,
-                         int64_t column)
+XQueryError::XQueryError(XQueryErrorCategory category, int64_t number, Ref<NSString> msg,
+                         int64_t line, Ref<NSString> sourceLine, int64_t column)
     : NSError(Kind::QueryError, errorDomain(), number, userInfoFor(msg, line)),
+      _category(category),
       _err(number),
       _msg(std::move(msg)),
       _line(line),
@@ -59,25 +61,41 @@ XQueryError::XQueryError(int64_t number, Ref<NSString> msg, int64_t line, Ref<NS
 }
 
 // It was logged when it was made.
-XQueryError::XQueryError(const XQueryError& error, Ref<NSString> moduleURL)
+XQueryError::XQueryError(const XQueryError& error, Ref<NSString> moduleURL, Ref<NSCounted> trace)
     : NSError(Kind::QueryError, errorDomain(), error.err(), userInfoFor(error.msg(), error.line())),
+      _category(error.category()),
       _err(error.err()),
       _msg(error.msg()),
       _line(error.line()),
       _sourceLine(error.sourceLine()),
       _column(error.column()),
-      _moduleURL(std::move(moduleURL)) {}
+      _moduleURL(std::move(moduleURL)),
+      _placeAndCalls(std::move(trace)) {}
 
 Ref<XQueryError> XQueryError::errorInModule(const XQueryError& error, Ref<NSString> moduleURL) {
-  return make<XQueryError>(error, std::move(moduleURL));
+  return make<XQueryError>(error, std::move(moduleURL), error._placeAndCalls);
+}
+
+Ref<XQueryError> XQueryError::_errorWithTrace(const XQueryError& error, Ref<NSCounted> trace) {
+  return make<XQueryError>(error, error._moduleURL, std::move(trace));
+}
+
+Ref<XQueryError> XQueryError::error(XQueryErrorCategory ofCategory, int64_t number,
+                                    const Ref<NSString>& withMsg) {
+  return make<XQueryError>(ofCategory, number, withMsg, int64_t{0});
+}
+
+Ref<XQueryError> XQueryError::error(XQueryErrorCategory ofCategory, int64_t number,
+                                    const Ref<NSString>& withMsg, int64_t atLine) {
+  return make<XQueryError>(ofCategory, number, withMsg, atLine + 1);
 }
 
 Ref<XQueryError> XQueryError::error(int64_t number, const Ref<NSString>& withMsg, int64_t atLine) {
-  return make<XQueryError>(number, withMsg, atLine + 1);
+  return error(XQueryErrorCategory::Internal, number, withMsg, atLine);
 }
 
 Ref<XQueryError> XQueryError::error(int64_t number, const Ref<NSString>& withMsg) {
-  return make<XQueryError>(number, withMsg, int64_t{0});
+  return error(XQueryErrorCategory::Internal, number, withMsg);
 }
 
 Ref<XQueryError> XQueryError::error(int64_t number, std::string_view withMsg, int64_t atLine) {
@@ -90,7 +108,28 @@ Ref<XQueryError> XQueryError::error(int64_t number, std::string_view withMsg) {
 
 Ref<XQueryError> XQueryError::error(int64_t number, const Ref<NSString>& withMsg, int64_t atLine,
                                     Ref<NSString> sourceLine, int64_t inColumn) {
-  return make<XQueryError>(number, withMsg, atLine + 1, std::move(sourceLine), inColumn + 1);
+  return make<XQueryError>(XQueryErrorCategory::Syntax, number, withMsg, atLine + 1,
+                           std::move(sourceLine), inColumn + 1);
+}
+
+std::optional<XQuerySourcePlace> XQueryError::place() const {
+  const auto* trace = XQueryErrorTrace::of(*this);
+  return trace ? trace->places().place(trace->place()) : std::nullopt;
+}
+
+std::vector<XQueryErrorCall> XQueryError::calls() const {
+  std::vector<XQueryErrorCall> calls;
+  const auto* trace = XQueryErrorTrace::of(*this);
+  if (!trace) return calls;
+  for (const XQueryTracedCall& call : trace->calls()) {
+    calls.push_back({call.function, trace->places().place(call.place)});
+  }
+  return calls;
+}
+
+int64_t XQueryError::callsLeftOut() const {
+  const auto* trace = XQueryErrorTrace::of(*this);
+  return trace ? trace->leftOut() : 0;
 }
 
 Ref<NSString> XQueryError::localizedDescription() const {
