@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Context/XQueryContextInternal.h"
+#include "Engine/ErrorPlaceText.h"
 #include "Engine/XQueryInternal.h"
 #include "Plan/FactsAnalysis.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
@@ -153,6 +154,7 @@ inline Outcome outcomeOf(const XQuery& query, const Value& contextItem,
     outcome.lines.push_back("error " + std::to_string(error->err()) + " line " +
                             std::to_string(error->line()) + " " +
                             (error->msg() ? error->msg()->utf8() : ""));
+    outcome.lines.push_back(placeText(*error));
   }
   if (items) {
     std::unordered_map<const NSObject*, size_t> places;

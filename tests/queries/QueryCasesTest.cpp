@@ -17,6 +17,7 @@
 //   element()	<b/>
 //   -- error 6 line 1 invalid type for operator     (instead of a result; "line N" is optional,
 //                                                    "..." stands for any text)
+#include "Engine/ErrorPlaceText.h"
 #include "Platform/Loading/LoadingTestSupport.h"
 #include "xquery/xquery.h"
 
@@ -191,6 +192,9 @@ class QueryCase : public testing::Test {
   }
 
  private:
+  // A place and calls do not depend on the way either.
+  std::string _plainPlace;
+
   // `isProjected`: of the document only that is read what the query needs.
   void run(XQueryWay way, bool isProjected = false) {
     const TestFolder folder;
@@ -220,6 +224,14 @@ class QueryCase : public testing::Test {
       for (size_t i = 0; items && i < items->count(); ++i) {
         lines.push_back(printed(*items->objectAtIndex(i)));
       }
+    }
+    if (error && way == XQueryWay::Plain) {
+      _plainPlace = replaced(placeText(*error), URL, place);
+    }
+    // How deep an evaluation gets before it reaches a limit does.
+    const bool isLimit = error && error->category() == XQueryErrorCategory::Limit;
+    if (error && !isLimit && way == XQueryWay::Planned) {
+      EXPECT_EQ(replaced(placeText(*error), URL, place), _plainPlace) << _case.query;
     }
     if (!_case.error.empty()) {
       ASSERT_TRUE(error) << _case.file << ":" << _case.line << " expected an error";
