@@ -2,8 +2,10 @@
 
 #include "JSON.h"
 #include "Messages.h"
+#include "Places.h"
 
 #include <cstdlib>
+#include <set>
 #include <string_view>
 #include <unistd.h>
 
@@ -51,7 +53,26 @@ std::string jsonOfError(const NSError& error) {
   if (own && own->line() > 0) json += ",\"line\":" + std::to_string(own->line());
   if (own && own->column() > 0) json += ",\"column\":" + std::to_string(own->column());
   if (own && own->moduleURL()) json += ",\"module\":" + jsonString(own->moduleURL()->utf8());
+  if (own) json += jsonOfPlace(*own);
   return json;
+}
+
+// One error may be found twice.
+std::vector<Ref<NSError>> distinct(const std::vector<Ref<NSError>>& errors) {
+  std::vector<Ref<NSError>> result;
+  std::set<std::string> told;
+  for (const Ref<NSError>& error : errors) {
+    if (told.insert(description(*error)).second) result.push_back(error);
+  }
+  return result;
+}
+
+// The description; where the place is told below it, without the line that names the module alone.
+std::string firstLines(const NSError& error) {
+  std::string text = description(error);
+  const auto* own = dyn_cast<XQueryError>(&error);
+  if (own && own->moduleURL() && own->place()) text.erase(text.rfind("\n  at "));
+  return text;
 }
 
 std::string asJSON(const Failure& failure, const std::string& input) {
@@ -61,7 +82,8 @@ std::string asJSON(const Failure& failure, const std::string& input) {
     return "{\"message\":" + jsonString(failure.message) + rest;
   }
   std::string lines;
-  for (const Ref<NSError>& error : failure.errors) lines += "{" + jsonOfError(*error) + rest;
+  for (const Ref<NSError>& error : distinct(failure.errors))
+    lines += "{" + jsonOfError(*error) + rest;
   return lines;
 }
 
@@ -70,9 +92,22 @@ std::string asJSON(const Failure& failure, const std::string& input) {
 std::string report(const Options& options, const Failure& failure, const std::string& input) {
   if (options.format == Format::JSON) return asJSON(failure, input);
   const bool isNamed = !input.empty() && failure.status == StatusQueryError;
-  const std::string text =
-      (isNamed ? visibleName(input) + ": " : "") + visible(failure.message) + "\n";
-  return usesColor(options) ? colored(text) : text;
+  const bool hasColor = usesColor(options);
+  const auto head = [&](const std::string& text) {
+    const std::string safe = visible(text);
+    return hasColor ? colored(safe) : safe;
+  };
+  const std::string name = isNamed ? visibleName(input) + ": " : "";
+  if (failure.errors.empty()) return head(name + failure.message) + "\n";
+  const Marks marks = hasColor ? Marks{"\033[1;31m", "\033[0m"} : Marks{};
+  std::string text;
+  for (const Ref<NSError>& error : distinct(failure.errors)) {
+    text += head((text.empty() ? name : "") + firstLines(*error));
+    const auto* own = dyn_cast<XQueryError>(error);
+    if (own) text += linesOfPlace(*own, options, marks);
+    text += "\n";
+  }
+  return text;
 }
 
 std::string warning(const Options& options, const XQueryMissingDocument& document) {

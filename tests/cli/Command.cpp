@@ -1,5 +1,6 @@
 #include "cli/Command.h"
 
+#include <algorithm>
 #include <cstdlib>
 #include <fcntl.h>
 #include <fstream>
@@ -97,6 +98,16 @@ Outcome shell(const std::string& script, const std::vector<std::string>& argumen
   std::vector<std::string> all{"-c", script, XQUERY_BINARY_DIR "/xquery"};
   all.insert(all.end(), arguments.begin(), arguments.end());
   return start("/bin/sh", all);
+}
+
+std::string withoutPlaces(const std::string& err) {
+  std::string result;
+  for (size_t at = 0; at < err.size();) {
+    const size_t end = std::min(err.find('\n', at), err.size() - 1) + 1;
+    if (err.compare(at, 2, "  ") != 0) result += err.substr(at, end - at);
+    at = end;
+  }
+  return result;
 }
 
 TemporaryDirectory::TemporaryDirectory() {

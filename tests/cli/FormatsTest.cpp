@@ -100,13 +100,18 @@ TEST(Formats, ErrorsAreJSONWithAnArray) {
   const TemporaryDirectory directory;
   const std::string file = directory.write("in", document);
   const Outcome one = xquery({"--as", "json", "-e", "1 +\n 1 idiv 0"});
-  EXPECT_EQ(one.err, "{\"code\":6,\"message\":\"divide by zero\",\"line\":2,\"status\":1}\n");
+  EXPECT_EQ(one.err,
+            "{\"code\":6,\"message\":\"divide by zero\",\"line\":2,\"category\":\"values\","
+            "\"place\":{\"line\":2,\"column\":2,\"length\":8},\"status\":1}\n");
   EXPECT_EQ(one.out, "");
   const Outcome both =
       xquery({"--as", "json", "-e", "1 idiv (2 - xs:integer(//@x) * 2)", file, "/nowhere"});
-  EXPECT_EQ(both.err, "{\"code\":6,\"message\":\"divide by zero\",\"line\":1,\"input\":\"" + file +
-                          "\",\"status\":1}\n{\"message\":\"xquery: /nowhere: No such file or "
-                          "directory\",\"input\":\"/nowhere\",\"status\":3}\n");
+  EXPECT_EQ(both.err,
+            "{\"code\":6,\"message\":\"divide by zero\",\"line\":1,\"category\":\"values\","
+            "\"place\":{\"line\":1,\"column\":1,\"length\":32},\"input\":\"" +
+                file +
+                "\",\"status\":1}\n{\"message\":\"xquery: /nowhere: No such file or "
+                "directory\",\"input\":\"/nowhere\",\"status\":3}\n");
   EXPECT_EQ(both.status, 3);
   // A program wants to know of a single input too, and of a stream.
   const std::string named = "{\"code\":6,\"message\":\"divide by zero\",\"line\":1,\"input\":\"";

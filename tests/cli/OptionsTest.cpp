@@ -217,14 +217,16 @@ TEST(Options, WhatAQueryOnTheCommandLineNamesIsLookedForInTheWorkingFolder) {
 TEST(Options, AModuleThatCannotBeUsedSaysWhy) {
   const TemporaryDirectory directory;
   const std::string module = directory.write("m.xq", "module namespace m = 'urn:m';\n#");
-  const Outcome outcome =
-      xquery({directory.write("q.xq", "import module namespace m = 'urn:m' at 'm.xq'; 1")});
+  const std::string import = "import module namespace m = 'urn:m' at 'm.xq'";
+  const std::string query = directory.write("q.xq", import + "; 1");
+  const Outcome outcome = xquery({query});
   EXPECT_EQ(outcome.status, 1);
   EXPECT_EQ(outcome.err,
             "XQueryError:47 - \"can't access module for prolog item module import:\"urn:m\" for "
-            "prefix:\"m\" at locations:\"m.xq\" line:0\"\nXQueryError:3 - \"invalid token (#) - "
-            "#\" at line:2\n  at file://" +
-                module + ":2\n");
+            "prefix:\"m\" at locations:\"m.xq\" line:0\"\n  at " +
+                query + ":1:1\n  1 | " + import + "; 1\n    | " + std::string(import.size(), '^') +
+                "\nXQueryError:3 - \"invalid token (#) - #\" at line:2\n  at " + module +
+                ":2:1\n  2 | #\n    | ^\n");
 }
 
 TEST(Options, RepeatPrintsOnceAndTimesMedianAndMinimum) {

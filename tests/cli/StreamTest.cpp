@@ -55,7 +55,8 @@ TEST(StreamCommand, RefusesBeforeAnythingIsRead) {
   EXPECT_EQ(outcome.out, "");
   EXPECT_EQ(outcome.err,
             "XQueryError:0 - \"cannot be evaluated as a stream: the function needs the whole of "
-            "its argument\" at line:2\n");
+            "its argument\" at line:2\n  at query:2:1\n  2 | reverse(/a/b)\n"
+            "    | ^^^^^^^^^^^^^\n");
   EXPECT_EQ(xquery({"--stream", "-e", "/a/b", "/no/such/file"}).status, 3);
 }
 
