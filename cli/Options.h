@@ -57,6 +57,8 @@ struct Options {
   unsigned jobs = 0;  // 0: as many as there are processors
   bool withName = false;
   bool isSession = false;  // queries come from the terminal, one after the other
+  // Of the prolog that a session puts before what is entered: messages do not count them.
+  size_t linesBefore = 0;
   Format format = Format::Lines;
   bool indent = false;
   Color color = Color::Auto;

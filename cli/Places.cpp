@@ -32,8 +32,13 @@ std::string moduleName(const XQuerySourcePlace& place, const Options& options) {
   return parsed && parsed->scheme() == "file" ? parsed->path() : URL;
 }
 
+int64_t lineOf(const XQuerySourcePlace& place, const Options& options) {
+  const auto before = static_cast<int64_t>(options.linesBefore);
+  return place.moduleURL || place.line <= before ? place.line : place.line - before;
+}
+
 std::string shown(const XQuerySourcePlace& place, const Options& options) {
-  return visible(moduleName(place, options)) + ":" + std::to_string(place.line) + ":" +
+  return visible(moduleName(place, options)) + ":" + std::to_string(lineOf(place, options)) + ":" +
          std::to_string(place.column);
 }
 
@@ -108,8 +113,9 @@ MarkedLine markedLine(const XQuerySourcePlace& place, size_t width) {
   return line;
 }
 
-std::string sourceLines(const XQuerySourcePlace& place, const Marks& marks) {
-  const std::string number = std::to_string(place.line);
+std::string sourceLines(const XQuerySourcePlace& place, const Options& options,
+                        const Marks& marks) {
+  const std::string number = std::to_string(lineOf(place, options));
   const size_t gutter = number.size() + 5;
   const size_t width = terminalWidth();
   const MarkedLine line =
@@ -149,7 +155,7 @@ std::string_view nameOf(XQueryErrorCategory category) {
 }  // namespace
 
 std::string queryName(const Options& options) {
-  if (options.queryText) return "query";
+  if (options.queryText || options.isSession) return "query";
   return options.queryFile == "-" ? "standard input" : options.queryFile;
 }
 
@@ -158,7 +164,7 @@ std::string linesOfPlace(const XQueryError& error, const Options& options, const
   if (!place) return "";
   const auto calls = error.calls();
   std::string text = "\n  at " + shown(*place, options) + shownIn(calls, 0);
-  text += sourceLines(*place, marks);
+  text += sourceLines(*place, options, marks);
   const bool isLong = calls.size() > 2 * mostCallsAtEachEnd;
   for (size_t index = 0; index < calls.size(); ++index) {
     if (isLong && index == mostCallsAtEachEnd) {

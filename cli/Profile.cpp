@@ -2,6 +2,7 @@
 
 #include "Documents.h"
 #include "Output.h"
+#include "Places.h"
 #include "Reports.h"
 #include "Streams.h"
 
@@ -59,9 +60,7 @@ void Profile::write(const Phases& phases) {
   if (_isWritten || _profile.evaluations() == 0) return;
   _isWritten = true;
   XQueryProfileSurroundings surroundings;
-  surroundings.name = _options.queryText          ? "-e"
-                      : _options.queryFile == "-" ? "standard input"
-                                                  : _options.queryFile;
+  surroundings.name = queryName(_options);
   surroundings.reading = phases.parse.sum();
   surroundings.printing = phases.print.sum();
   if (_options.hasInputs()) surroundings.inputs = _inputs;

@@ -131,7 +131,7 @@ namespace {
 
 // As the query or the module was named.
 std::string fileOf(const Options& options, const XQueryWarning& warning) {
-  if (!warning.module) return options.queryText ? "-e" : options.queryFile;
+  if (!warning.module) return queryName(options);
   const Ref<NSURL> URL = NSURL::URLWithString(warning.module);
   const bool isFile = URL && URL->scheme() == "file";
   return isFile ? URL->path() : warning.module->utf8();

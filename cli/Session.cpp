@@ -273,7 +273,9 @@ bool Session::reporting(const Query& query, const Work& work) {
     if (interruption()->load()) {
       refuse("interrupted");
     } else {
-      writeMessage(withoutPrologLines(report(_options, failure), query.declarations.lines()));
+      Options options = _options;
+      options.linesBefore = query.declarations.lines();
+      writeMessage(withoutPrologLines(report(options, failure), options.linesBefore));
     }
   } catch (const std::exception& error) {
     refuse(visible(error.what()));

@@ -5,7 +5,9 @@
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Labels.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Base/XQueryPlaces.h"
 #include "Prolog/XQueryDeclarations.h"
+#include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 
 #include <algorithm>
@@ -55,15 +57,16 @@ size_t XQueryChecking::numberOf(const XQueryProlog& module) {
 }
 
 // "." is one expression for all places and carries no place: that of the nearest whole serves.
-void XQueryChecking::setPlace(const XQueryProgram& program, XQueryPlaceID place,
-                              XQueryWarning& warning) {
-  int64_t line = 0;
+XQueryChecking::Spot XQueryChecking::spotOf(const XQueryProgram& program, XQueryPlaceID place) {
+  Spot spot{0};
   for (int level = 0; place != XQueryNoPlace && level < mostLevels; ++level) {
-    line = std::max(line, program[place].expr->exprLine());
-    if (program[place].expr->kind() != Kind::ContextItemExpr && line > 0) break;
+    const XQueryExpr& expr = *program[place].expr;
+    spot.line = std::max(spot.line, expr.exprLine());
+    spot.number = expr.exprPlace();
+    if (spot.number != 0) break;
     place = program[place].parent;
   }
-  warning.line = line + 1;
+  return spot;
 }
 
 XQueryWarning XQueryChecking::warningOf(ID id, Parts parts, const Ref<NSString>& name) {
@@ -85,26 +88,40 @@ XQueryWarning XQueryChecking::warningOf(ID id, Parts parts, const Ref<NSString>&
   return warning;
 }
 
-void XQueryChecking::add(const XQueryProlog& module, XQueryPlaceID place, XQueryWarning warning) {
+void XQueryChecking::add(const XQueryProlog& module, XQueryPlaceID place, Spot spot,
+                         XQueryWarning warning) {
   if (isFull()) return;
   if (&module != &main && module.moduleURL()) warning.module = module.moduleURL()->absoluteString();
-  _found.push_back({numberOf(module), place, std::move(warning)});
+  warning.line = spot.line + 1;
+  _found.push_back({numberOf(module), place, spot.number, std::move(warning)});
 }
 
 void XQueryChecking::warn(XQueryPlaceID place, ID id, Parts parts, const Ref<NSString>& name) {
-  XQueryWarning warning = warningOf(id, parts, name);
-  setPlace(program, place, warning);
-  add(*program.bodyOf(place).prolog, place, std::move(warning));
+  add(*program.bodyOf(place).prolog, place, spotOf(program, place), warningOf(id, parts, name));
 }
 
-void XQueryChecking::warnAt(const XQueryProlog& module, int64_t line, ID id, Parts parts,
+void XQueryChecking::warnAt(const XQueryProlog& module, Spot spot, ID id, Parts parts,
                             const Ref<NSString>& name) {
-  XQueryWarning warning = warningOf(id, parts, name);
-  warning.line = line + 1;
-  add(module, XQueryNoPlace, std::move(warning));
+  add(module, XQueryNoPlace, spot, warningOf(id, parts, name));
+}
+
+// In the order of the text, which is then read but once.
+void XQueryChecking::findColumns() {
+  const XQueryPlaces& places = *main.modules().places();
+  std::stable_sort(_found.begin(), _found.end(), [&](const Found& a, const Found& b) {
+    return std::tuple(a.module, places.span(a.number).start) <
+           std::tuple(b.module, places.span(b.number).start);
+  });
+  XQueryPlaceCursor cursor(places);
+  for (Found& each : _found) {
+    if (!cursor.goTo(each.number)) continue;
+    each.warning.line = cursor.line();
+    each.warning.column = cursor.column();
+  }
 }
 
 std::vector<XQueryWarning> XQueryChecking::takeWarnings() {
+  findColumns();
   std::stable_sort(_found.begin(), _found.end(), [](const Found& a, const Found& b) {
     return std::tuple(a.module, a.warning.line, a.warning.column, a.place) <
            std::tuple(b.module, b.warning.line, b.warning.column, b.place);

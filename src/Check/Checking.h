@@ -34,8 +34,14 @@ class XQueryChecking {
 
   // The parts take the places of "…" in the text of the warning.
   void warn(XQueryPlaceID place, ID id, Parts parts = {}, const Ref<NSString>& name = nullptr);
-  // The same at a line of a module, counted from 0, where no expression stands.
-  void warnAt(const XQueryProlog& module, int64_t line, ID id, Parts parts = {},
+  // Where no expression stands: the line, counted from 0, and the number of the place where it is
+  // known.
+  struct Spot {
+    int64_t line;
+    XQueryPlaceNumber number = 0;
+  };
+  // The same at a spot of a module.
+  void warnAt(const XQueryProlog& module, Spot spot, ID id, Parts parts = {},
               const Ref<NSString>& name = nullptr);
   bool isFull() const { return _found.size() >= mostWarnings; }
   // What has been found, in order.
@@ -92,11 +98,12 @@ class XQueryChecking {
   struct Found {
     size_t module;  // 0 for the main one, the others in the order of the bodies
     XQueryPlaceID place;
+    XQueryPlaceNumber number;  // of its place in the text
     XQueryWarning warning;
   };
-  // Where an expression stands. The only one who knows what places are made of.
-  static void setPlace(const XQueryProgram& program, XQueryPlaceID place, XQueryWarning& warning);
-  void add(const XQueryProlog& module, XQueryPlaceID place, XQueryWarning warning);
+  static Spot spotOf(const XQueryProgram& program, XQueryPlaceID place);
+  void add(const XQueryProlog& module, XQueryPlaceID place, Spot spot, XQueryWarning warning);
+  void findColumns();
   size_t numberOf(const XQueryProlog& module);
   static XQueryWarning warningOf(ID id, Parts parts, const Ref<NSString>& name);
 

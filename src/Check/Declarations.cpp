@@ -219,21 +219,21 @@ class Declarations {
   void lookAtType(const XQueryProgramBody& body, const XQueryTypeDeclaration* type, int64_t line) {
     if (!type || type->type() != XQueryTypeDeclaration::Atomic) return;
     if (typeOf(*body.prolog, *type) != XQueryTypeNone) return;
-    _checking.warnAt(*body.prolog, line, ID::UnknownType, {XQueryLabelOf(*type)});
+    _checking.warnAt(*body.prolog, {line}, ID::UnknownType, {XQueryLabelOf(*type)});
   }
 
   void lookAtExternals() {
     for (const Value& declaration : _checking.main.declarations()) {
       if (const auto* function = dyn_cast<XQueryFunctionDecl>(declaration)) {
         if (!function->isExternal()) continue;
-        _checking.warnAt(function->prolog(), function->line(), ID::ExternalFunction,
-                         {nameOf(*function)}, function->writtenName());
+        _checking.warnAt(function->prolog(), {function->line(), function->place()},
+                         ID::ExternalFunction, {nameOf(*function)}, function->writtenName());
       } else if (const auto* variable = dyn_cast<XQueryVarDecl>(declaration)) {
         const auto* type = variable->type();
         if (!variable->isExternal() || !type || !variable->writtenName()) continue;
         if (type->type() == XQueryTypeDeclaration::Item) continue;
-        _checking.warnAt(variable->prolog(), variable->line(), ID::ExternalType,
-                         {variable->writtenName()->utf8(), XQueryLabelOf(*type)},
+        _checking.warnAt(variable->prolog(), {variable->line(), variable->place()},
+                         ID::ExternalType, {variable->writtenName()->utf8(), XQueryLabelOf(*type)},
                          variable->writtenName());
       }
     }

@@ -31,7 +31,7 @@ bool mayMakeElements(const XQueryChecking& checking) {
 void tell(XQueryChecking& checking, const XQueryProlog& module, const XQueryRemark& remark) {
   const std::string first = textOf(remark.first);
   const auto warn = [&](ID id, XQueryChecking::Parts parts = {}) {
-    checking.warnAt(module, remark.line, id, parts);
+    checking.warnAt(module, {remark.line}, id, parts);
   };
   switch (remark.matter) {
     case Matter::EndTag:
@@ -65,7 +65,7 @@ void checkImports(XQueryChecking& checking, const XQueryProlog& module) {
   }
   for (const auto& import : module.moduleImports()) {
     if (namespaces.contains(textOf(import->namespaceString()))) continue;
-    checking.warnAt(module, import->line(), ID::ModuleNamespace,
+    checking.warnAt(module, {import->line(), import->place()}, ID::ModuleNamespace,
                     {textOf(import->namespaceString())});
   }
 }

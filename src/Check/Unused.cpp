@@ -78,7 +78,8 @@ class Unused {
       if (!name || isMeant(name) || !_uses.readsOf(variable).empty()) continue;
       const auto* body = _checking.bodyOf(variable);
       if (body && _checking.factsOf(body->place).does(XQueryDeeds::Traces)) continue;
-      _checking.warnAt(_checking.main, variable->line(), ID::UnusedVariable, {name->utf8()}, name);
+      _checking.warnAt(_checking.main, {variable->line(), variable->place()}, ID::UnusedVariable,
+                       {name->utf8()}, name);
     }
   }
 
@@ -115,7 +116,8 @@ class Unused {
       const Ref<NSString>& name = function->writtenName();
       if (!name || isMeant(name) || reached.contains(function)) continue;
       if (_missed.contains(name->utf8())) continue;
-      _checking.warnAt(_checking.main, function->line(), ID::UnusedFunction, {name->utf8()}, name);
+      _checking.warnAt(_checking.main, {function->line(), function->place()}, ID::UnusedFunction,
+                       {name->utf8()}, name);
     }
   }
 

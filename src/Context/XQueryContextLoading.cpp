@@ -40,7 +40,7 @@ bool isHTML(const XQueryResource& resource, const NSURL& URL) {
   return path.ends_with(".html") || path.ends_with(".htm");
 }
 
-std::string placed(const NSXMLParseError& error) {
+std::string reasonAndPlace(const NSXMLParseError& error) {
   if (error.line == 0) return error.message;
   return "line " + std::to_string(error.line) + ", column " + std::to_string(error.column) + ": " +
          error.message;
@@ -90,7 +90,7 @@ Ref<NSXMLDocument> XQueryContextInternal::loadDocument(const NSURL& URL, std::st
   if (document) {
     document->setURI(URL.absoluteString());
   } else {
-    reason = placed(error);
+    reason = reasonAndPlace(error);
   }
   return document;
 }

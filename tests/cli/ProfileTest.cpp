@@ -60,7 +60,7 @@ TEST_F(ProfileCommand, WritesTheFormThatTheNameOfTheFileSays) {
     EXPECT_EQ(outcome.err, "");
   }
   EXPECT_THAT(content("p.json"), StartsWith("{\"evaluations\":1,\"name\":\"-e\""));
-  EXPECT_THAT(content("p.txt"), StartsWith("-e: 1 evaluation\n"));
+  EXPECT_THAT(content("p.txt"), StartsWith("query: 1 evaluation\n"));
   EXPECT_THAT(content("p.html"), StartsWith("<!doctype html>\n"));
   EXPECT_EQ(files(), 3u);
 }
@@ -121,7 +121,7 @@ TEST_F(ProfileCommand, AddsUpRepetitionsAndInputs) {
   EXPECT_EQ(jsonMember(json, "failures"), "0");
   EXPECT_THAT(json, HasSubstr("}],\"calls\":6,\"items\":9,\"failures\":0,"));
   xquery({"--profile", path("p.txt"), "--repeat", "3", "-e", query, a, b});
-  EXPECT_THAT(content("p.txt"), StartsWith("-e: 6 evaluations for 2 inputs\nreading "));
+  EXPECT_THAT(content("p.txt"), StartsWith("query: 6 evaluations for 2 inputs\nreading "));
 }
 
 TEST_F(ProfileCommand, IsWrittenOfWhatFailed) {
@@ -135,7 +135,7 @@ TEST_F(ProfileCommand, IsWrittenOfWhatFailed) {
   EXPECT_EQ(jsonMember(content("p.json"), "failures"), "1");
   EXPECT_EQ(xquery({"--profile", path("q.txt"), "-e", "error('x', 'y')"}).status, 1);
   EXPECT_THAT(content("q.txt"),
-              AllOf(HasSubstr("-e: 1 evaluation, 1 failed\n"), HasSubstr("error(...)")));
+              AllOf(HasSubstr("query: 1 evaluation, 1 failed\n"), HasSubstr("error(...)")));
 }
 
 // Nothing was evaluated.

@@ -27,9 +27,9 @@ TEST(Warnings, StandOnStandardErrorAndLeaveTheStatusAlone) {
 }
 
 TEST(Warnings, NameTheQueryAsItWasGiven) {
-  const std::string rest = ":1: warning: variable $a is never used [unused-variable]\n";
-  EXPECT_EQ(xquery({"--check", "-e", "let $a := 1 return 2"}).err, "-e" + rest);
-  EXPECT_EQ(xquery({"--check", "-"}, "let $a := 1 return 2").err, "-" + rest);
+  const std::string rest = ":1:1: warning: variable $a is never used [unused-variable]\n";
+  EXPECT_EQ(xquery({"--check", "-e", "let $a := 1 return 2"}).err, "query" + rest);
+  EXPECT_EQ(xquery({"--check", "-"}, "let $a := 1 return 2").err, "standard input" + rest);
 }
 
 TEST(Warnings, OfModulesNameTheirFiles) {
@@ -69,7 +69,7 @@ TEST(Warnings, AreObjectsWhereTheResultIs) {
 TEST(Warnings, AreColoredAsOtherMessages) {
   const Outcome outcome = xquery({"--check", "--color", "always", "-e", "let $a := 1 return 2"});
   EXPECT_EQ(outcome.err,
-            "-e:1: \033[1;35mwarning:\033[0m variable $a is never used [unused-variable]\n");
+            "query:1:1: \033[1;35mwarning:\033[0m variable $a is never used [unused-variable]\n");
 }
 
 TEST(Warnings, OfAPrefixThatTheCommandLineDeclaresThereAreNone) {

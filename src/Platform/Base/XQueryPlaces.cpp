@@ -57,29 +57,49 @@ XQuerySpan XQueryPlaces::span(XQueryPlaceNumber place) const {
   return place == 0 || place > _spans.size() ? XQuerySpan() : _spans[place - 1];
 }
 
-std::optional<XQuerySourcePlace> XQueryPlaces::place(XQueryPlaceNumber place) const {
-  if (place == 0 || place > _spans.size()) return std::nullopt;
+const XQueryPlaces::Module* XQueryPlaces::moduleOf(XQueryPlaceNumber place) const {
+  if (place == 0 || place > _spans.size()) return nullptr;
   const auto after = std::upper_bound(
       _modules.begin(), _modules.end(), place,
       [](XQueryPlaceNumber number, const Module& row) { return number < row.first; });
-  if (after == _modules.begin()) return std::nullopt;
-  const Module& module = *(after - 1);
-  const XQuerySpan span = _spans[place - 1];
-  XQuerySourcePlace result{module.URL, 1, 1, static_cast<int64_t>(span.end) - span.start, nullptr};
-  const NSStringView text = module.text->view();
-  uint32_t at = text.length() > 0 && text[0] == byteOrderMark ? 1 : 0;
-  uint32_t lineStart = at;
-  for (uint32_t count = 0; count < span.start && at < text.length(); ++count) {
-    const bool isLineEnd = endsLine(text[at]);
-    at += characterLength(text, at);
-    ++result.column;
-    if (!isLineEnd) continue;
-    ++result.line;
-    result.column = 1;
-    lineStart = at;
+  return after == _modules.begin() ? nullptr : &*(after - 1);
+}
+
+std::optional<XQuerySourcePlace> XQueryPlaces::place(XQueryPlaceNumber place) const {
+  XQueryPlaceCursor cursor(*this);
+  if (!cursor.goTo(place)) return std::nullopt;
+  const XQuerySpan at = span(place);
+  return XQuerySourcePlace{moduleOf(place)->URL, cursor.line(), cursor.column(),
+                           static_cast<int64_t>(at.end) - at.start, cursor.sourceLine()};
+}
+
+// --- the cursor ----------------------------------------------------------------------------------
+
+bool XQueryPlaceCursor::goTo(XQueryPlaceNumber place) {
+  const XQueryPlaces::Module* const module = _places.moduleOf(place);
+  if (!module) return false;
+  const uint32_t start = _places.span(place).start;
+  const NSStringView text = module->text->view();
+  if (module != _module || start < _characters) {
+    _module = module;
+    _characters = 0;
+    _at = _lineStart = text.length() > 0 && text[0] == byteOrderMark ? 1 : 0;
+    _line = _column = 1;
   }
-  result.sourceLine = lineFrom(text, lineStart);
-  return result;
+  for (; _characters < start && _at < text.length(); ++_characters) {
+    const bool isLineEnd = endsLine(text[_at]);
+    _at += characterLength(text, _at);
+    ++_column;
+    if (!isLineEnd) continue;
+    ++_line;
+    _column = 1;
+    _lineStart = _at;
+  }
+  return true;
+}
+
+Ref<NSString> XQueryPlaceCursor::sourceLine() const {
+  return lineFrom(_module->text->view(), _lineStart);
 }
 
 }  // namespace xquery

@@ -56,9 +56,37 @@ class XQueryPlaces : public NSCounted {
     Ref<NSString> text;
     Ref<NSString> URL;
   };
+  friend class XQueryPlaceCursor;
+
+  // Of a place that there is.
+  const Module* moduleOf(XQueryPlaceNumber place) const;
 
   std::vector<Module> _modules;
   std::vector<XQuerySpan, ValueAllocator<XQuerySpan>> _spans;
+};
+
+// Finds the lines of places. Asked for places of one text in the order in which they begin, it
+// reads that text once.
+class XQueryPlaceCursor {
+ public:
+  explicit XQueryPlaceCursor(const XQueryPlaces& places) : _places(places) {}
+
+  // Goes to the start of the place. False for 0, and the cursor stays.
+  bool goTo(XQueryPlaceNumber place);
+  // Both from 1.
+  int64_t line() const { return _line; }
+  int64_t column() const { return _column; }
+  // The text of the line, without its end.
+  Ref<NSString> sourceLine() const;
+
+ private:
+  const XQueryPlaces& _places;
+  const XQueryPlaces::Module* _module = nullptr;
+  uint32_t _characters = 0;  // before it
+  uint32_t _at = 0;          // the unit, and that in which its line begins
+  uint32_t _lineStart = 0;
+  int64_t _line = 1;
+  int64_t _column = 1;
 };
 
 }  // namespace xquery
