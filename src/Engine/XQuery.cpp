@@ -345,6 +345,7 @@ Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
     return result;
   } catch (const NSException&) {
     if (XQueryIsLimit(_private->error().get())) dropValues(*_private, contextItem, position);
+    // The context keeps the error without its place, which would keep the text of the query.
     return tracedError(*_private, _private->error());
   } catch (const std::bad_alloc&) {
     dropValues(*_private, contextItem, position);

@@ -319,7 +319,9 @@ TEST_F(Driver, AnExceptionWithoutAnErrorHandsOutTheLastOne) {
     throw NSException("AnyName", text("reason"));
   };
   EXPECT_FALSE(evaluateBody(fail));
-  EXPECT_EQ(error, earlier);
+  ASSERT_TRUE(error);
+  EXPECT_EQ(error->err(), earlier->err());
+  EXPECT_EQ(error->msg(), earlier->msg());
 }
 
 TEST_F(Driver, OtherExceptionsPassThrough) {

@@ -164,7 +164,7 @@ TEST(FoldConstants, MakesOneLiteralOfWhatIsConstant) {
 TEST(FoldConstants, LeavesWhatFailsWhereItStands) {
   resultOf("if (1) then 2 else 1 idiv 0");
   EXPECT_EQ(resultOf("1 = \n (1 div 0)"),
-            (std::vector<std::string>{"error 6 line 2 Division by zero"}));
+            (std::vector<std::string>{"error 6 line 2 Division by zero", "at 2:3+7"}));
   EXPECT_EQ(bodyOf("1 = (1 div 0)"), "xs:integer 1;xs:integer 1;xs:integer 0;");
 }
 

@@ -108,7 +108,7 @@ TEST(Formats, ErrorsAreJSONWithAnArray) {
       xquery({"--as", "json", "-e", "1 idiv (2 - xs:integer(//@x) * 2)", file, "/nowhere"});
   EXPECT_EQ(both.err,
             "{\"code\":6,\"message\":\"divide by zero\",\"line\":1,\"category\":\"values\","
-            "\"place\":{\"line\":1,\"column\":1,\"length\":32},\"input\":\"" +
+            "\"place\":{\"line\":1,\"column\":1,\"length\":33},\"input\":\"" +
                 file +
                 "\",\"status\":1}\n{\"message\":\"xquery: /nowhere: No such file or "
                 "directory\",\"input\":\"/nowhere\",\"status\":3}\n");
