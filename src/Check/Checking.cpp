@@ -122,10 +122,12 @@ void XQueryChecking::findColumns() {
 
 std::vector<XQueryWarning> XQueryChecking::takeWarnings() {
   findColumns();
-  std::stable_sort(_found.begin(), _found.end(), [](const Found& a, const Found& b) {
-    return std::tuple(a.module, a.warning.line, a.warning.column, a.place) <
-           std::tuple(b.module, b.warning.line, b.warning.column, b.place);
-  });
+  const auto keyOf = [](const Found& found) {
+    const XQueryWarning& warning = found.warning;
+    return std::tuple(found.module, warning.line, warning.column == 0, warning.column, found.place);
+  };
+  std::stable_sort(_found.begin(), _found.end(),
+                   [&](const Found& a, const Found& b) { return keyOf(a) < keyOf(b); });
   std::vector<XQueryWarning> warnings;
   warnings.reserve(_found.size());
   for (Found& each : _found) warnings.push_back(std::move(each.warning));

@@ -114,13 +114,17 @@ TEST(Formats, ErrorsAreJSONWithAnArray) {
                 "directory\",\"input\":\"/nowhere\",\"status\":3}\n");
   EXPECT_EQ(both.status, 3);
   // A program wants to know of a single input too, and of a stream.
-  const std::string named = "{\"code\":6,\"message\":\"divide by zero\",\"line\":1,\"input\":\"";
+  const auto named = [](int column) {
+    return "{\"code\":6,\"message\":\"divide by zero\",\"line\":1,\"category\":\"values\","
+           "\"place\":{\"line\":1,\"column\":" +
+           std::to_string(column) + ",\"length\":8},\"input\":\"";
+  };
   EXPECT_EQ(xquery({"--as", "json", "-e", "1 idiv 0", file}).err,
-            named + file + "\",\"status\":1}\n");
+            named(1) + file + "\",\"status\":1}\n");
   EXPECT_EQ(xquery({"--as", "json", "--stream", "-e", "for $b in /a/b return 1 idiv 0", file}).err,
-            named + file + "\",\"status\":1}\n");
+            named(23) + file + "\",\"status\":1}\n");
   EXPECT_EQ(xquery({"--as", "json", "-e", "1 idiv 0", "-"}, "<a/>").err,
-            named + "standard input\",\"status\":1}\n");
+            named(1) + "standard input\",\"status\":1}\n");
 }
 
 }  // namespace

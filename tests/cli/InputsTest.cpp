@@ -141,7 +141,7 @@ TEST_F(Inputs, HaveNamesThatStayWithinAMessage) {
   write(name, 0);
   EXPECT_EQ(xquery({"-e", "1", path(name) + "?"}).err,
             "xquery: " + shown + "?: No such file or directory\n");
-  EXPECT_EQ(xquery({"-e", "1 idiv xs:integer(/)", path(name), write("b", 1)}).err,
+  EXPECT_EQ(withoutPlaces(xquery({"-e", "1 idiv xs:integer(/)", path(name), write("b", 1)}).err),
             shown + ": XQueryError:6 - \"divide by zero\" at line:1\n");
   EXPECT_EQ(xquery({path("q\ty")}).err,
             "xquery: " + folder + "q\\u0009y: No such file or directory\n");

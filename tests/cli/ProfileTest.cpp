@@ -59,7 +59,7 @@ TEST_F(ProfileCommand, WritesTheFormThatTheNameOfTheFileSays) {
     EXPECT_EQ(outcome.out, "10\n");
     EXPECT_EQ(outcome.err, "");
   }
-  EXPECT_THAT(content("p.json"), StartsWith("{\"evaluations\":1,\"name\":\"-e\""));
+  EXPECT_THAT(content("p.json"), StartsWith("{\"evaluations\":1,\"name\":\"query\""));
   EXPECT_THAT(content("p.txt"), StartsWith("query: 1 evaluation\n"));
   EXPECT_THAT(content("p.html"), StartsWith("<!doctype html>\n"));
   EXPECT_EQ(files(), 3u);

@@ -77,14 +77,20 @@ TEST_F(Session, HasADocumentThatIsNamedOnTheCommandLine) {
 
 TEST_F(Session, GoesOnAfterAnErrorWithItsLineInTheEntry) {
   const auto session = begin();
-  EXPECT_EQ(session->ask("1 idiv 0"), "XQueryError:6 - \"divide by zero\" at line:1\n");
+  EXPECT_EQ(session->ask("1 idiv 0"),
+            "XQueryError:6 - \"divide by zero\" at line:1\n"
+            "  at query:1:1\n  1 | 1 idiv 0\n    | ^^^^^^^^\n");
   EXPECT_EQ(session->ask("declare variable $a := 1; declare variable $b := 2;"), "");
   session->ask("(1,", more);
-  EXPECT_EQ(session->ask(" $a idiv 0)"), "XQueryError:6 - \"divide by zero\" at line:2\n");
+  EXPECT_EQ(session->ask(" $a idiv 0)"),
+            "XQueryError:6 - \"divide by zero\" at line:2\n"
+            "  at query:2:2\n  2 |  $a idiv 0)\n    |  ^^^^^^^^^\n");
   EXPECT_EQ(session->ask("$c"),
-            "XQueryError:8 - \"reference to undefined variable \"c\"\" at line:1\n");
+            "XQueryError:8 - \"reference to undefined variable \"c\"\" at line:1\n"
+            "  at query:1:1\n  1 | $c\n    | ^^\n");
   EXPECT_EQ(session->ask("1 ]"),
-            "XQueryError:3 - \"parse error invalid token (])- 1 ]\" at line:1\n");
+            "XQueryError:3 - \"parse error invalid token (])- 1 ]\" at line:1\n"
+            "  at query:1:3\n  1 | 1 ]\n    |   ^\n");
 }
 
 TEST_F(Session, KeepsWhatIsDeclared) {
@@ -107,7 +113,8 @@ TEST_F(Session, KeepsNoDeclarationThatFails) {
   EXPECT_THAT(session->ask("$a"), StartsWith("XQueryError:8"));
   EXPECT_THAT(session->ask("declare variable $b := $nothing;"), StartsWith("XQueryError:8"));
   EXPECT_EQ(session->ask("declare variable $c := 1; $c idiv 0"),
-            "XQueryError:6 - \"divide by zero\" at line:1\n");
+            "XQueryError:6 - \"divide by zero\" at line:1\n"
+            "  at query:1:2\n  1 |  $c idiv 0\n    |  ^^^^^^^^^\n");
   EXPECT_EQ(session->ask("$c"), "1\n") << "what is wrong with the query is not wrong with them";
 }
 
@@ -155,7 +162,8 @@ TEST_F(Session, FollowsTheOptions) {
   EXPECT_EQ(session->ask("$v + 1"), "[{\"type\":\"xs:double\",\"value\":5}]\n");
   EXPECT_EQ(session->ask("count($d//book)"), "[{\"type\":\"xs:integer\",\"value\":4}]\n");
   EXPECT_EQ(session->ask("1 idiv 0"),
-            "{\"code\":6,\"message\":\"divide by zero\",\"line\":1,\"status\":1}\n");
+            "{\"code\":6,\"message\":\"divide by zero\",\"line\":1,\"category\":\"values\","
+            "\"place\":{\"line\":1,\"column\":1,\"length\":8},\"status\":1}\n");
   EXPECT_THAT(session->ask(endless), HasSubstr("limit: deadline passed"));
   EXPECT_EQ(session->ask("2"), "[{\"type\":\"xs:integer\",\"value\":2}]\n")
       << "the limit is that of one evaluation";

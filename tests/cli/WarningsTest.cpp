@@ -20,14 +20,14 @@ TEST(Warnings, StandOnStandardErrorAndLeaveTheStatusAlone) {
   const Outcome outcome = xquery({"--check", file});
   EXPECT_EQ(outcome.status, 0);
   EXPECT_EQ(outcome.out, "");
-  EXPECT_EQ(outcome.err, file + ":1: warning: variable $a is never used [unused-variable]\n" +
+  EXPECT_EQ(outcome.err, file + ":1:6: warning: variable $a is never used [unused-variable]\n" +
                              file +
-                             ":3: warning: there is no function counts that takes 1 argument "
+                             ":3:3: warning: there is no function counts that takes 1 argument "
                              "[unknown-function]\n");
 }
 
 TEST(Warnings, NameTheQueryAsItWasGiven) {
-  const std::string rest = ":1:1: warning: variable $a is never used [unused-variable]\n";
+  const std::string rest = ":1:6: warning: variable $a is never used [unused-variable]\n";
   EXPECT_EQ(xquery({"--check", "-e", "let $a := 1 return 2"}).err, "query" + rest);
   EXPECT_EQ(xquery({"--check", "-"}, "let $a := 1 return 2").err, "standard input" + rest);
 }
@@ -40,7 +40,7 @@ TEST(Warnings, OfModulesNameTheirFiles) {
       directory.write("q.xq", "import module namespace m = 'urn:m' at 'm.xq'; m:f()");
   EXPECT_EQ(xquery({"--check", file}).err,
             module +
-                ":2: warning: there is no function counts that takes 1 argument "
+                ":2:26: warning: there is no function counts that takes 1 argument "
                 "[unknown-function]\n");
 }
 
@@ -62,14 +62,15 @@ TEST(Warnings, AreObjectsWhereTheResultIs) {
   const Outcome outcome = xquery({"--check", "--as", "json", "-e", "1,\nlet $a := 1 return 2"});
   EXPECT_EQ(outcome.status, 0);
   EXPECT_EQ(outcome.err,
-            "{\"warning\":\"unused-variable\",\"message\":\"variable $a is never used\",\"line\":2}"
+            "{\"warning\":\"unused-variable\",\"message\":\"variable $a is never used\",\"line\":2,"
+            "\"column\":6}"
             "\n");
 }
 
 TEST(Warnings, AreColoredAsOtherMessages) {
   const Outcome outcome = xquery({"--check", "--color", "always", "-e", "let $a := 1 return 2"});
   EXPECT_EQ(outcome.err,
-            "query:1:1: \033[1;35mwarning:\033[0m variable $a is never used [unused-variable]\n");
+            "query:1:6: \033[1;35mwarning:\033[0m variable $a is never used [unused-variable]\n");
 }
 
 TEST(Warnings, OfAPrefixThatTheCommandLineDeclaresThereAreNone) {

@@ -4,6 +4,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryClauseItems.h"
 #include "Expr/Clauses/XQueryFLWORSort.h"
+#include "Expr/XQueryAsking.h"
 #include "Expr/XQueryParts.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryProlog.h"
@@ -194,8 +195,10 @@ bool XQueryFLWORExpr::evaluateGiven(const XQueryForExpr& clause, size_t index,
     bool goesOn = true;
 
     bool take(Value item) override {
-      goesOn =
-          _flwor.evaluateItem(_clause, _index, std::move(item), _position++, _results, _context);
+      goesOn = XQueryAsk(_flwor, _context, [&] {
+        return _flwor.evaluateItem(_clause, _index, std::move(item), _position++, _results,
+                                   _context);
+      });
       return goesOn;
     }
 

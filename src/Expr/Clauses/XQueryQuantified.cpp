@@ -3,6 +3,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryClauseItems.h"
+#include "Expr/XQueryAsking.h"
 #include "Expr/XQueryParts.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
@@ -115,7 +116,9 @@ Value XQueryQuantifiedExpr::evaluateGiven(size_t clause, size_t index,
     Value answer;
 
     bool take(Value item) override {
-      answer = _quantifier.evaluateItem(_clause, _index, std::move(item), _context);
+      answer = XQueryAsk(_quantifier, _context, [&] {
+        return _quantifier.evaluateItem(_clause, _index, std::move(item), _context);
+      });
       return answer == _quantifier.undecided();
     }
 

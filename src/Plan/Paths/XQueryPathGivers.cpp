@@ -16,7 +16,10 @@ bool XQueryShortPathGiver::giveItems(XQueryContext& context, Taker& taker) const
   if (NSXMLNode* const start = _walk.start(context); start && !dynamic.showsErrors()) {
     // The variable that it starts from may be the one that takes the nodes.
     const Value held(start);
-    _walk.visit(start, [&taker](NSXMLNode* found) { return taker.take(Value(found)); });
+    XQueryAsk(*_path, context, [&] {
+      _walk.visit(start, [&taker](NSXMLNode* found) { return taker.take(Value(found)); });
+      return true;
+    });
   } else {
     const Value items = _path->evaluateWithContext(context);
     if (XQueryHasFailed(items, context)) return false;

@@ -3,6 +3,7 @@
 // items are given then.
 #pragma once
 
+#include "Expr/XQueryAsking.h"
 #include "Expr/XQueryItemGiver.h"
 #include "Plan/Operators/XQueryShortWalk.h"
 #include "Plan/Paths/XQueryWalkedPath.h"
@@ -17,7 +18,7 @@ class XQueryWalkedPathGiver final : public XQueryItemGiver {
   explicit XQueryWalkedPathGiver(Ref<XQueryWalkedPath> path) : _path(std::move(path)) {}
 
   bool giveItems(XQueryContext& context, Taker& taker) const override {
-    return _path->giveItems(context, taker);
+    return XQueryAsk(*_path, context, [&] { return _path->giveItems(context, taker); });
   }
 
  private:

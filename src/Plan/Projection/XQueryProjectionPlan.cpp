@@ -1,5 +1,6 @@
 #include "Plan/Projection/XQueryProjectionPlan.h"
 
+#include "Context/StackGuard.h"
 #include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryNameTest.h"
@@ -164,7 +165,7 @@ class Analysis {
 
   // Once for each place. `focus` is what "." may be.
   Sources visit(XQueryPlaceID place, const Sources& focus) {
-    if (++_depth > mostDepth) refuse(place, "the query nests too deeply");
+    if (++_depth > mostDepth || !XQueryStackHasRoom()) refuse(place, "the query nests too deeply");
     Sources sources = visitHere(place, focus);
     --_depth;
     return sources;

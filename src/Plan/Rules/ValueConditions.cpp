@@ -166,7 +166,7 @@ class Search {
     using namespace XQueryDeeds;
     // All that a predicate looks at is in the tree of its context item, as are its ways.
     const bool isInPredicate = from.origin.errorExcludes && !from.caller;
-    const unsigned unknown = isInPredicate ? ReadsFocus & ~unsigned{ReadsRoot} : ReadsFocus;
+    const unsigned unknown = ReadsFocus & ~(isInPredicate ? unsigned{ReadsRoot} : 0U);
     return isIdleButForErrors(place) && !probe.does(unknown) && probe.assigns.isEmpty() &&
            !probe.reads.meets(from.own) &&
            probe.mayBe(XQueryItems::Node | XQueryItems::Untyped | XQueryItems::String);
