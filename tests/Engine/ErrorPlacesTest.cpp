@@ -29,6 +29,7 @@ const std::map<std::string, std::string>& modules() {
        "declare variable $m:v := 1;\n"
        "declare function m:f($x) { 1 idiv $x };"},
       {"m:g", "module namespace m = 'm';\ndeclare variable $m:v := 1 idiv 0;"},
+      {"m:h", "module namespace m = 'm';\ndeclare function m:h() { 1 };"},
       {"m:syntax", "module namespace m = 'm';\ndeclare variable 1;"},
   };
   return texts;
@@ -185,7 +186,9 @@ const std::vector<Row>& rows() {
       ROW(duplicateVariable,
           "import module namespace m = 'm' at 'm:f';\n"
           "«import module namespace n = 'm' at 'm:f'»; 1"),
-      NONE(duplicateFunction, "an import finds the variables twice first: see the test of imports"),
+      ROW(duplicateFunction,
+          "import module namespace m = 'm' at 'm:h';\n"
+          "«import module namespace n = 'm' at 'm:h'»; 1"),
       ROW(secondDefaultCollation,
           "declare default collation 'u:a'; «declare default collation 'u:b';» 1"),
       ROW(duplicateParameter, "declare function local:f($x, «$x as item()») { 1 }; 1"),
@@ -418,6 +421,16 @@ TEST(ErrorPlaces, LeaveTheDescriptionAlone) {
             "XQueryError:8 - \"reference to undefined variable \"x\"\" at line:2");
   EXPECT_EQ(errorOf("1 idiv 0", XQueryWay::Planned)->description()->utf8(),
             "XQueryError:6 - \"divide by zero\" at line:1");
+}
+
+TEST(ErrorPlaces, OfRefusedStreamsAreWhereTheReasonIs) {
+  for (const char* marked : {"for $b in /a/b return «$b/..»", "for $b in /a/b return «/a»"}) {
+    const Marked query(marked);
+    const auto error = errorOf(query.text, XQueryWay::Streamed);
+    ASSERT_TRUE(error) << query.text;
+    EXPECT_EQ(placeOf(*error), query.place) << error->description()->utf8();
+    EXPECT_TRUE(error->calls().empty());
+  }
 }
 
 // A query can imitate the text of a limit, and not its category.
