@@ -170,7 +170,8 @@ class XQUERY_EXPORT XQueryError : public NSError {
   XQueryErrorNumber number() const { return static_cast<XQueryErrorNumber>(_err); }
   // The innermost expression that was being evaluated, or what a compilation could not use; nothing
   // where that is not known. A line here is that of the place's first character, which line() need
-  // not be.
+  // not be. An error with a place keeps the text of its query, and of the modules of that, as long
+  // as it lives.
   //
   //   if (const auto place = error->place()) mark(place->line, place->column, place->length);
   std::optional<XQuerySourcePlace> place() const;
