@@ -32,10 +32,11 @@ size_t bytesOf(const NSURL& URL) {
 
 bool isHTML(const XQueryResource& resource, const NSURL& URL) {
   if (resource.MIMEType && lowerCase(*resource.MIMEType) == "text/html") return true;
-  std::string path = lowerCase(URL.relativePath());
+  const std::string whole = lowerCase(URL.relativePath());
+  std::string_view path = whole;
   // What is packed is called after what is in it.
   for (const std::string_view ending : {".gz", ".xz", ".zst", ".bz2"}) {
-    if (path.ends_with(ending)) path.resize(path.size() - ending.size());
+    if (path.ends_with(ending)) path.remove_suffix(ending.size());
   }
   return path.ends_with(".html") || path.ends_with(".htm");
 }

@@ -2,6 +2,7 @@
 // there is nothing to say.
 #include "Check/Check.h"
 #include "CheckTesting.h"
+#include "Platform/Base/SanitizedSizes.h"
 
 #include <gmock/gmock.h>
 
@@ -125,7 +126,7 @@ TEST(CheckedQueries, MayBeVeryLong) {
 }
 
 TEST(CheckedQueries, MayBeVeryDeep) {
-  constexpr size_t levels = 20'000;
+  constexpr size_t levels = 20'000 / largeInputDivisor;
   EXPECT_EQ(warningsOf(repeated("(", levels) + "//a" + repeated(")", levels)), "");
   EXPECT_EQ(warningsOf(repeated("not(", levels) + "//a" + repeated(")", levels)), "");
   EXPECT_EQ(warningsOf(repeated("<a>{", levels) + "//a" + repeated("}</a>", levels)), "");
