@@ -126,7 +126,7 @@ TEST(CheckedQueries, MayBeVeryLong) {
 }
 
 TEST(CheckedQueries, MayBeVeryDeep) {
-  constexpr size_t levels = 20'000 / largeInputDivisor;
+  constexpr size_t levels = 20'000 / (largeInputDivisor * largeInputDivisor);
   EXPECT_EQ(warningsOf(repeated("(", levels) + "//a" + repeated(")", levels)), "");
   EXPECT_EQ(warningsOf(repeated("not(", levels) + "//a" + repeated(")", levels)), "");
   EXPECT_EQ(warningsOf(repeated("<a>{", levels) + "//a" + repeated("}</a>", levels)), "");
