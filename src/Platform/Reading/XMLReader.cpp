@@ -261,8 +261,15 @@ const char* XMLReader::readDeclarationLike(const char* at) {
 
 // --- text ------------------------------------------------------------------------------------
 
+// Whether the text, of one byte at least, begins with what goes on with a character.
+bool isCutBefore(std::string_view bytes) {
+  return (static_cast<unsigned char>(bytes.front()) & 0xC0U) == 0x80;
+}
+
+// Text beside a section is looked at together with it: the one must not complete a character of
+// the other.
 ReadText XMLReader::textOf(std::string_view bytes, uint64_t wide) const {
-  take(bytes.size() <= longestPieceTaken && !(wide && _isASCII));
+  take(bytes.size() <= longestPieceTaken && !(wide && (_isASCII || isCutBefore(bytes))));
   return {bytes, wide == 0};
 }
 
