@@ -82,6 +82,18 @@ Ref<XQueryDuration> XQueryDuration::durationWithString(NSStringView text) {
   return duration;
 }
 
+Ref<XQueryDuration> XQueryDuration::durationWithFields(const Fields& fields) {
+  Ref<XQueryDuration> duration = make<XQueryDuration>();
+  duration->_isNeg = fields.isNeg;
+  duration->_year = fields.year;
+  duration->_month = fields.month;
+  duration->_day = fields.day;
+  duration->_hour = fields.hour;
+  duration->_minute = fields.minute;
+  duration->_second = fields.second;
+  return duration;
+}
+
 std::string XQueryDuration::timeText() const {
   std::string text;
   appendField(text, _hour, 'H');

@@ -16,6 +16,18 @@ class XQueryDuration : public NSCounted {
   // Null for any deviation from the lexical form, and for a field beyond 32 bits.
   [[nodiscard]] static Ref<XQueryDuration> durationWithString(NSStringView text);
 
+  // What is written of one; no field is below 0.
+  struct Fields {
+    bool isNeg = false;
+    int32_t year = 0;
+    int32_t month = 0;
+    int32_t day = 0;
+    int32_t hour = 0;
+    int32_t minute = 0;
+    double second = 0;
+  };
+  [[nodiscard]] static Ref<XQueryDuration> durationWithFields(const Fields& fields);
+
   XQueryTypeID typeID() const { return XQueryTypeDuration; }
   bool isNeg() const { return _isNeg; }
   int32_t year() const { return _year; }

@@ -1,8 +1,6 @@
 // The public questions about a result and its items.
 #include "Types/XQueryBinary.h"
 #include "Types/XQueryNodeFunctions.h"
-#include "Types/XQueryQName.h"
-#include "Types/XQueryTypeTable.h"
 #include "Types/XQueryValues.h"
 #include "xquery/XQuery.h"
 
@@ -16,32 +14,6 @@ Ref<NSError> XQueryFirstError(const Ref<NSArray>& items, const Ref<XQueryError>&
   const auto found = std::find_if(objects.begin(), objects.end(),
                                   [](const Value& item) { return isa<NSError>(item); });
   return found == objects.end() ? nullptr : cast<NSError>(*found);
-}
-
-std::string XQueryItemTypeName(const NSObject& item) {
-  switch (item.kind()) {
-    case Kind::Document:
-      return "document-node()";
-    case Kind::Element:
-      return "element()";
-    case Kind::Attribute:
-      return "attribute()";
-    case Kind::Namespace:
-      return "namespace()";
-    case Kind::ProcessingInstruction:
-      return "processing-instruction()";
-    case Kind::Comment:
-      return "comment()";
-    case Kind::Text:
-      return "text()";
-    default:
-      break;
-  }
-  const Ref<XQueryQName> name = XQueryQNameForTypeID(XQueryObjectTypeID(&item));
-  if (!name) return "item()";
-  const Ref<XQueryQName> schemaName = XQueryQNameForTypeID(XQueryTypeAnyType);
-  const bool inSchema = name->namespaceURI() == schemaName->namespaceURI();
-  return (inSchema ? "xs:" : "xdt:") + name->localPart()->utf8();
 }
 
 std::string XQueryItemStringValue(const NSObject& item) {
