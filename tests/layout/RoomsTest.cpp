@@ -18,7 +18,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-constexpr std::array<std::string_view, 17> rooms = {
+constexpr std::array<std::string_view, 18> rooms = {
     "Platform/Base",
     "Platform/Text",
     "Platform/Numbers",
@@ -36,6 +36,7 @@ constexpr std::array<std::string_view, 17> rooms = {
     "Check",
     "Parser",
     "Engine",
+    "C",
 };
 
 // The prolog holds expressions and declared types, and they are bound in the prolog: the two know

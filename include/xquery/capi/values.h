@@ -76,7 +76,7 @@ typedef struct xq_date_time {
   int32_t second;
   int32_t nanosecond;
   int32_t has_zone;     /* 0: no zone was given */
-  int32_t zone_seconds; /* east of GMT is positive */
+  int32_t zone_seconds; /* east of GMT is positive; whole minutes, at most 14 hours */
 } xq_date_time;
 
 /* All fields together have the sign. */
@@ -101,7 +101,6 @@ XQUERY_EXPORT xq_status xq_value_free(xq_value* value);
 XQUERY_EXPORT xq_status xq_value_add_integer(xq_value* value, int64_t integer);
 XQUERY_EXPORT xq_status xq_value_add_unsigned(xq_value* value, uint64_t integer);
 XQUERY_EXPORT xq_status xq_value_add_double(xq_value* value, double number);
-/* An infinity or what is no number becomes that of xs:double. */
 XQUERY_EXPORT xq_status xq_value_add_float(xq_value* value, float number);
 /* Anything but 0 is true. */
 XQUERY_EXPORT xq_status xq_value_add_boolean(xq_value* value, int boolean);

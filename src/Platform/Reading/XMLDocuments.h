@@ -37,6 +37,11 @@ class XMLProjection;
                                                          uint64_t mostBytes,
                                                          NSXMLParseError& error);
 
+// Of what the input gives, which cannot be read again; plain or packed. Null with an empty error
+// where the input fails, of which whoever gave it knows more.
+[[nodiscard]] Ref<NSXMLDocument> documentWithInput(const TextInput& input, uint32_t options,
+                                                   NSXMLParseError& error);
+
 // libxml2's way.
 [[nodiscard]] Ref<NSXMLDocument> readWithLibXML(const TextInput& input, uint32_t options,
                                                 size_t expectedBytes, NSXMLParseError& error,

@@ -108,6 +108,12 @@ Ref<NSXMLDocument> NSXMLDocument::documentWithData(std::string_view bytes, uint3
                                  error ? *error : ignored);
 }
 
+Ref<NSXMLDocument> documentWithInput(const TextInput& input, uint32_t options,
+                                     NSXMLParseError& error) {
+  UnpackedInput unpacked(input);
+  return readUnpacked(unpacked, options, nullptr, error);
+}
+
 Ref<NSXMLDocument> NSXMLDocument::documentWithFile(const std::string& path, uint32_t options,
                                                    NSXMLParseError* error,
                                                    const NSXMLReadingProgress& progress) {

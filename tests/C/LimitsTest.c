@@ -1,0 +1,242 @@
+/* Time, memory and cancellation, of evaluations and compilations. */
+#define _POSIX_C_SOURCE 200809L
+
+#include "Testing.h"
+
+#include <pthread.h>
+#include <signal.h>
+#include <string.h>
+#include <time.h>
+
+static const char endless[] = "count(for $i in 1 to 1000000, $j in 1 to 1000000 return $i)";
+
+static double now(void) {
+  struct timespec time;
+  clock_gettime(CLOCK_MONOTONIC, &time);
+  return (double)time.tv_sec + (double)time.tv_nsec / 1e9;
+}
+
+/* Evaluates under the options and checks the message of the limit that ends it. */
+static void check_limit(const xq_options* options, const char* text, const char* message) {
+  xq_query* query = compiled(text);
+  xq_query* small = compiled("1");
+  xq_context* context = NULL;
+  xq_value* items = NULL;
+  xq_error* error = NULL;
+  xq_category category = -1;
+  xq_string found;
+  CHECK_OK(xq_context_new(&context));
+  CHECK_OK(xq_context_set_options(context, options));
+  CHECK_STATUS(xq_evaluate(context, query, &items, &error), XQ_ERROR);
+  CHECK_OK(xq_error_category(error, &category));
+  CHECK_NUMBER(category, XQ_CATEGORY_LIMIT);
+  CHECK_OK(xq_error_message(error, &found));
+  CHECK_TEXT(found, message);
+  CHECK_OK(xq_error_free(error));
+  /* The context can be used again at once. */
+  CHECK_OK(xq_context_set_options(context, NULL));
+  CHECK_OK(xq_evaluate(context, small, &items, NULL));
+  check_items(items, "1");
+  CHECK_OK(xq_value_free(items));
+  CHECK_OK(xq_context_free(context));
+  CHECK_OK(xq_query_free(query));
+  CHECK_OK(xq_query_free(small));
+}
+
+static void a_timeout_ends_an_evaluation(void) {
+  xq_options* options = NULL;
+  const double start = now();
+  CHECK_OK(xq_options_new(&options));
+  CHECK_OK(xq_options_set_timeout(options, 50000000));
+  check_limit(options, endless, "limit: deadline passed");
+  CHECK(now() - start < 30);
+  CHECK_OK(xq_options_set_timeout(options, 0));
+  check_limit(options, "1", "limit: deadline passed");
+  CHECK_OK(xq_options_set_timeout(options, INT64_MIN));
+  check_limit(options, "1", "limit: deadline passed");
+  CHECK_OK(xq_options_free(options));
+}
+
+static void a_deadline_is_one_for_all(void) {
+  xq_options* options = NULL;
+  CHECK_OK(xq_options_new(&options));
+  CHECK_OK(xq_options_set_deadline(options, 20000000));
+  check_limit(options, endless, "limit: deadline passed");
+  check_limit(options, "1", "limit: deadline passed");
+  CHECK_OK(xq_options_set_deadline(options, INT64_MIN));
+  check_limit(options, "1", "limit: deadline passed");
+  CHECK_OK(xq_options_set_deadline(options, INT64_MAX));
+  CHECK_OK(xq_options_set_timeout(options, 20000000));
+  check_limit(options, endless, "limit: deadline passed");
+  CHECK_OK(xq_options_free(options));
+}
+
+static void a_memory_ceiling_ends_an_evaluation(void) {
+  xq_options* options = NULL;
+  CHECK_OK(xq_options_new(&options));
+  CHECK_OK(xq_options_set_memory(options, 4000000));
+  check_limit(options, "count((1 to 10000000, 1))", "limit: memory ceiling reached");
+  CHECK_OK(xq_options_free(options));
+}
+
+static void limits_can_be_taken_back(void) {
+  xq_options* options = NULL;
+  xq_cancel* cancel = NULL;
+  xq_query* query = NULL;
+  CHECK_OK(xq_options_new(&options));
+  CHECK_OK(xq_cancel_new(&cancel));
+  CHECK_OK(xq_cancel_raise(cancel));
+  CHECK_OK(xq_options_set_cancel(options, cancel));
+  CHECK_OK(xq_options_set_timeout(options, 0));
+  CHECK_OK(xq_options_set_deadline(options, 0));
+  CHECK_OK(xq_options_set_memory(options, 0));
+  CHECK_STATUS(xq_compile("1", 1, options, &query, NULL), XQ_ERROR);
+  CHECK_OK(xq_options_clear_limits(options));
+  CHECK_OK(xq_compile("1", 1, options, &query, NULL));
+  CHECK_OK(xq_query_free(query));
+  /* A flag alone can be taken back as well. */
+  CHECK_OK(xq_options_set_cancel(options, cancel));
+  CHECK_STATUS(xq_compile("1", 1, options, &query, NULL), XQ_ERROR);
+  CHECK_OK(xq_options_set_cancel(options, NULL));
+  CHECK_OK(xq_compile("1", 1, options, &query, NULL));
+  CHECK_OK(xq_query_free(query));
+  CHECK_OK(xq_cancel_free(cancel));
+  CHECK_OK(xq_options_free(options));
+}
+
+static void* raise_soon(void* cancel) {
+  const struct timespec pause = {0, 30000000};
+  nanosleep(&pause, NULL);
+  CHECK_OK(xq_cancel_raise((const xq_cancel*)cancel));
+  return NULL;
+}
+
+static void another_thread_cancels_an_evaluation(void) {
+  xq_options* options = NULL;
+  xq_cancel* cancel = NULL;
+  pthread_t thread;
+  int is_raised = 0;
+  CHECK_OK(xq_options_new(&options));
+  CHECK_OK(xq_cancel_new(&cancel));
+  CHECK_OK(xq_options_set_cancel(options, cancel));
+  CHECK(pthread_create(&thread, NULL, raise_soon, cancel) == 0);
+  check_limit(options, endless, "limit: evaluation cancelled");
+  CHECK(pthread_join(thread, NULL) == 0);
+  CHECK_OK(xq_cancel_is_raised(cancel, &is_raised));
+  CHECK_NUMBER(is_raised, 1);
+  /* It stays raised, until it is lowered. */
+  check_limit(options, "1", "limit: evaluation cancelled");
+  CHECK_OK(xq_cancel_lower(cancel));
+  CHECK_OK(xq_cancel_is_raised(cancel, &is_raised));
+  CHECK_NUMBER(is_raised, 0);
+  CHECK_OK(xq_options_free(options));
+  CHECK_OK(xq_cancel_free(cancel));
+  check_still_works();
+}
+
+static xq_cancel* cancel_of_signal = NULL;
+
+static void on_alarm(int signal) {
+  (void)signal;
+  xq_cancel_raise(cancel_of_signal);
+}
+
+static void a_signal_handler_cancels_an_evaluation(void) {
+  xq_options* options = NULL;
+  struct sigaction action;
+  struct sigaction former;
+  timer_t timer;
+  const struct itimerspec soon = {{0, 0}, {0, 30000000}};
+  memset(&action, 0, sizeof(action));
+  action.sa_handler = on_alarm;
+  CHECK_OK(xq_options_new(&options));
+  CHECK_OK(xq_cancel_new(&cancel_of_signal));
+  CHECK_OK(xq_options_set_cancel(options, cancel_of_signal));
+  CHECK(sigaction(SIGALRM, &action, &former) == 0);
+  CHECK(timer_create(CLOCK_MONOTONIC, NULL, &timer) == 0);
+  CHECK(timer_settime(timer, 0, &soon, NULL) == 0);
+  check_limit(options, endless, "limit: evaluation cancelled");
+  CHECK(timer_delete(timer) == 0);
+  CHECK(sigaction(SIGALRM, &former, NULL) == 0);
+  CHECK_OK(xq_options_free(options));
+  CHECK_OK(xq_cancel_free(cancel_of_signal));
+}
+
+static void a_flag_outlives_its_handle(void) {
+  xq_options* options = NULL;
+  xq_cancel* cancel = NULL;
+  CHECK_OK(xq_options_new(&options));
+  CHECK_OK(xq_cancel_new(&cancel));
+  CHECK_OK(xq_options_set_cancel(options, cancel));
+  CHECK_OK(xq_cancel_raise(cancel));
+  CHECK_OK(xq_cancel_free(cancel));
+  check_limit(options, "1", "limit: evaluation cancelled");
+  CHECK_OK(xq_options_free(options));
+}
+
+/* A callback that starts an evaluation of its own meets the limit of the one around. */
+static int evaluate_endlessly(void* data, const xq_value* value, const char* label, size_t length) {
+  xq_query* query = compiled(endless);
+  xq_context* context = NULL;
+  xq_value* items = NULL;
+  xq_error* error = NULL;
+  xq_string message;
+  (void)value, (void)label, (void)length;
+  CHECK_OK(xq_context_new(&context));
+  CHECK_STATUS(xq_evaluate(context, query, &items, &error), XQ_ERROR);
+  CHECK_OK(xq_error_message(error, &message));
+  CHECK(strstr(message.data, "limit: deadline passed") != NULL);
+  CHECK_OK(xq_error_free(error));
+  CHECK_OK(xq_context_free(context));
+  CHECK_OK(xq_query_free(query));
+  ++*(int*)data;
+  return 0;
+}
+
+static void a_limit_ends_evaluations_within_callbacks(void) {
+  xq_query* query = compiled("trace(1, 'label') + count(for $i in 1 to 1000000 return $i)");
+  xq_options* options = NULL;
+  xq_context* context = NULL;
+  xq_value* items = NULL;
+  xq_error* error = NULL;
+  xq_string message;
+  int calls = 0;
+  CHECK_OK(xq_options_new(&options));
+  CHECK_OK(xq_options_set_timeout(options, 30000000));
+  CHECK_OK(xq_context_new(&context));
+  CHECK_OK(xq_context_set_options(context, options));
+  CHECK_OK(xq_context_set_trace(context, evaluate_endlessly, &calls, NULL));
+  CHECK_STATUS(xq_evaluate(context, query, &items, &error), XQ_ERROR);
+  CHECK_OK(xq_error_message(error, &message));
+  CHECK_TEXT(message, "limit: deadline passed");
+  CHECK_NUMBER(calls, 1);
+  CHECK_OK(xq_error_free(error));
+  CHECK_OK(xq_context_free(context));
+  CHECK_OK(xq_options_free(options));
+  CHECK_OK(xq_query_free(query));
+}
+
+static void ways_and_limits_that_there_are_not_are_wrong_use(void) {
+  xq_options* options = NULL;
+  CHECK_OK(xq_options_new(&options));
+  CHECK_STATUS(xq_options_set_way(options, XQ_WAY_PROFILED + 1), XQ_USAGE);
+  CHECK_STATUS(xq_options_set_way(options, -1), XQ_USAGE);
+  CHECK_STATUS(xq_options_set_loading_limit(options, -1, 1), XQ_USAGE);
+  CHECK_STATUS(xq_options_set_loading_limit(options, XQ_LOADING_MODULES + 1, 1), XQ_USAGE);
+  CHECK_STATUS(xq_options_forbid_addresses(options, XQ_ADDRESSES_LOCAL + 1), XQ_USAGE);
+  CHECK_STATUS(xq_options_forbid_addresses(options, -1), XQ_USAGE);
+  CHECK_OK(xq_options_free(options));
+}
+
+const test_case limits_tests[] = {
+    {"a timeout ends an evaluation", a_timeout_ends_an_evaluation},
+    {"a deadline is one for all", a_deadline_is_one_for_all},
+    {"a memory ceiling ends an evaluation", a_memory_ceiling_ends_an_evaluation},
+    {"limits can be taken back", limits_can_be_taken_back},
+    {"another thread cancels an evaluation", another_thread_cancels_an_evaluation},
+    {"a signal handler cancels an evaluation", a_signal_handler_cancels_an_evaluation},
+    {"a flag outlives its handle", a_flag_outlives_its_handle},
+    {"a limit ends evaluations within callbacks", a_limit_ends_evaluations_within_callbacks},
+    {"ways and limits that there are not", ways_and_limits_that_there_are_not_are_wrong_use},
+    TEST_END,
+};
