@@ -45,6 +45,18 @@ TEST(EmbeddingPage, SaysWhatTheProgramPrints) {
   EXPECT_EQ(outcome.out, blocks(page, "console"));
 }
 
+TEST(EmbeddingPage, HasTheCompiledProgramInC) {
+  ASSERT_NE(blocks(page, "c"), "");
+  EXPECT_EQ(blocks(page, "c"), readFile(XQUERY_SOURCE_DIR "/examples/embedding.c"));
+}
+
+TEST(EmbeddingPage, SaysWhatTheProgramInCPrints) {
+  const Outcome outcome = command::start("xquery_embedding_c", {books()});
+  EXPECT_EQ(outcome.status, 0);
+  EXPECT_EQ(outcome.err, "");
+  EXPECT_EQ(outcome.out, blocks(page, "text"));
+}
+
 // The same lines, with its own name of a program, build a consumer of the installed library.
 TEST(EmbeddingPage, BuildsAsTheInstalledLibraryIsTested) {
   const std::string consumer = readFile(XQUERY_SOURCE_DIR "/tests/install/consumer.cmake");

@@ -29,6 +29,25 @@ TEST(Readme, ItsProgramIsTheCompiledExample) {
   EXPECT_EQ(codeBlock(readme, "cpp"), example);
 }
 
+TEST(Readme, ItsProgramInCIsTheCompiledExample) {
+  const std::string readme = readFile(XQUERY_SOURCE_DIR "/README.md");
+  const std::string example = readFile(XQUERY_SOURCE_DIR "/examples/embed.c");
+  ASSERT_NE(example, "");
+  EXPECT_EQ(codeBlock(readme, "c"), example);
+}
+
+TEST(Readme, TheExampleInCPrintsTheTitles) {
+  const Outcome outcome = command::start("xquery_embed_c", {books()});
+  EXPECT_EQ(outcome.status, 0);
+  EXPECT_EQ(outcome.out, "A Field Guide to Lichens\nBrücken & Wege\n");
+}
+
+TEST(Readme, TheExampleInCReportsADocumentThatIsNotThere) {
+  const Outcome outcome = command::start("xquery_embed_c", {"/nowhere.xml"});
+  EXPECT_EQ(outcome.status, 3);
+  EXPECT_EQ(outcome.err, "/nowhere.xml: No such file or directory\n");
+}
+
 TEST(Readme, TheExamplePrintsTheTitles) {
   const Outcome outcome = command::start("xquery_embed", {books()});
   EXPECT_EQ(outcome.status, 0);

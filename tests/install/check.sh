@@ -8,7 +8,7 @@ trap 'rm -rf "$work"' EXIT
 
 cmake --install "$build_dir" --prefix "$work/prefix" >/dev/null
 mkdir "$work/src"
-cp "$source_dir/examples/embed.cpp" "$work/src/"
+cp "$source_dir/examples/embed.cpp" "$source_dir/examples/embed.c" "$work/src/"
 books=$source_dir/examples/books.xml
 expected=$'A Field Guide to Lichens\nBrücken & Wege'
 
@@ -18,6 +18,13 @@ case $way in
     cmake -S "$work/src" -B "$work/build" -G Ninja -DCMAKE_PREFIX_PATH="$work/prefix" >/dev/null
     cmake --build "$work/build" >/dev/null
     actual=$("$work/build/embed" "$books")
+    # A program in C needs no C++ of its own.
+    mkdir "$work/c"
+    cp "$work/src/embed.c" "$work/c/"
+    cp "$source_dir/tests/install/consumer_c.cmake" "$work/c/CMakeLists.txt"
+    cmake -S "$work/c" -B "$work/build_c" -G Ninja -DCMAKE_PREFIX_PATH="$work/prefix" >/dev/null
+    cmake --build "$work/build_c" >/dev/null
+    actual_c=$("$work/build_c/embed" "$books")
     ;;
   pkg-config)
     PKG_CONFIG_PATH=$(dirname "$(find "$work/prefix" -name xquery.pc)")
@@ -27,6 +34,10 @@ case $way in
     g++ -std=c++20 "$work/src/embed.cpp" -o "$work/embed" $(pkg-config --cflags --libs xquery) \
       -Wl,-rpath,"$(pkg-config --variable=libdir xquery)"
     actual=$("$work/embed" "$books")
+    # shellcheck disable=SC2046
+    gcc -std=c99 -Wall -Wextra -Wpedantic -Werror "$work/src/embed.c" -o "$work/embed_c" \
+      $(pkg-config --cflags --libs xquery) -Wl,-rpath,"$(pkg-config --variable=libdir xquery)"
+    actual_c=$("$work/embed_c" "$books")
     ;;
   command)
     actual=$("$work/prefix/bin/xquery" -e '//book[price > 10]/title/text()' "$books")
@@ -42,4 +53,5 @@ case $way in
     done
     ;;
 esac
+[ "${actual_c-$actual}" = "$actual" ] || { echo "unexpected output of C: $actual_c" >&2; exit 1; }
 [ "$actual" = "$expected" ] || { echo "unexpected output: $actual" >&2; exit 1; }
