@@ -1,0 +1,52 @@
+// What the families of the extension module know of each other.
+//
+// The module `_xquery` holds what has to be quick or needs the library: nodes, results, values,
+// compiled queries and their evaluation. The package `xquery` around it is Python.
+//
+// Rules that hold everywhere:
+//   - the interpreter's lock is released while the library compiles, evaluates or reads, and held
+//     wherever a Python object is touched
+//   - objects of Python that the library calls back are kept during the call alone, or by
+//   `Settings`
+//     which the collector of cycles can look into; so no cycle hides in the library
+//   - classes and functions of Python that are needed often are looked up once and never given
+//     back, since the order in which things go when a process ends is nobody's to know
+#pragma once
+
+#include <xquery/xquery.h>
+
+#include <pybind11/pybind11.h>
+#include <string>
+#include <string_view>
+
+namespace xquery::python {
+
+namespace py = pybind11;
+
+void addKnown(py::module_& module);
+void addNodes(py::module_& module);
+void addResults(py::module_& module);
+void addSettings(py::module_& module);
+void addQueries(py::module_& module);
+void addDocuments(py::module_& module);
+void addStreams(py::module_& module);
+
+// What is made or asked for often and is written in Python.
+struct Known {
+  py::handle decimal, mapping, path, warn;
+  py::handle place, call, error, limitError, compileError, documentError, missingWarning;
+  py::handle URI, untyped, notation, hexBinary, qName, dateTime, date, time, duration,
+      monthDuration, gYearMonth, gYear, gMonthDay, gMonth, gDay;
+};
+// Looked up when the package has been imported, by one thread, and never given back.
+const Known& known();
+
+// Text of the library as a str; what is no text becomes U+FFFD.
+py::object toStr(NSStringView text);
+py::object toStr(std::string_view utf8);
+// The same, None for no text.
+py::object toStrOrNone(const Ref<NSString>& text);
+// Raises ValueError for a str with a surrogate of its own.
+std::string fromStr(const py::handle& text);
+
+}  // namespace xquery::python

@@ -1,0 +1,43 @@
+// Texts between the library and Python, both ways.
+#include "Module.h"
+
+#include <bit>
+#include <cstring>
+
+namespace xquery::python {
+
+py::object toStr(NSStringView text) {
+  PyObject* result = nullptr;
+  if (text.isWide()) {
+    int order = std::endian::native == std::endian::little ? -1 : 1;
+    result = PyUnicode_DecodeUTF16(reinterpret_cast<const char*>(text.wideUnits()),
+                                   static_cast<Py_ssize_t>(text.length()) * 2, "replace", &order);
+  } else {
+    result = PyUnicode_New(text.length(), 127);
+    if (result && text.length() > 0) {
+      std::memcpy(PyUnicode_1BYTE_DATA(result), text.asciiUnits(), text.length());
+    }
+  }
+  if (!result) throw py::error_already_set();
+  return py::reinterpret_steal<py::object>(result);
+}
+
+py::object toStr(std::string_view utf8) {
+  PyObject* result =
+      PyUnicode_DecodeUTF8(utf8.data(), static_cast<Py_ssize_t>(utf8.size()), "replace");
+  if (!result) throw py::error_already_set();
+  return py::reinterpret_steal<py::object>(result);
+}
+
+py::object toStrOrNone(const Ref<NSString>& text) {
+  return text ? toStr(text->view()) : py::none();
+}
+
+std::string fromStr(const py::handle& text) {
+  Py_ssize_t size = 0;
+  const char* utf8 = PyUnicode_AsUTF8AndSize(text.ptr(), &size);
+  if (!utf8) throw py::error_already_set();
+  return {utf8, static_cast<size_t>(size)};
+}
+
+}  // namespace xquery::python

@@ -1,0 +1,157 @@
+"""How queries are compiled and evaluated."""
+
+from __future__ import annotations
+
+import os
+from dataclasses import dataclass, fields
+from typing import (
+    Any,
+    Callable,
+    Dict,
+    Mapping,
+    NamedTuple,
+    Optional,
+    Protocol,
+    Tuple,
+    Union,
+)
+
+from . import _xquery
+from ._xquery import Cancellation, Result
+
+__all__ = ["Loader", "Policy", "Resource"]
+
+
+@dataclass(frozen=True)
+class Policy:
+    """What queries may load: documents, modules, raw bodies and stylesheets.
+
+    Immutable; each method answers a new policy. Without rules any file, http and https URL is
+    allowed. A program that evaluates the queries of others begins with ``deny``:
+
+    >>> import xquery
+    >>> xquery.Policy.deny().allow_files("/srv/data").allow_urls("https://example.org/public/")
+    Policy.deny().allow_files('/srv/data').allow_urls('https://example.org/public/')
+    """
+
+    rules: Tuple[Tuple[str, str], ...] = ()
+
+    @classmethod
+    def deny(cls) -> Policy:
+        """Nothing is allowed, but for what is added."""
+        return cls((("deny", ""),))
+
+    def _with(self, name: str, argument: str = "") -> Policy:
+        return Policy((*self.rules, (name, argument)))
+
+    def allow_files(self, folder: Union[str, os.PathLike[str]]) -> Policy:
+        """Files in that folder, which must exist, and in the folders under it."""
+        return self._with("allow_files", os.fspath(folder))
+
+    def allow_urls(self, url: str) -> Policy:
+        """What is at or below a URL on a server."""
+        return self._with("allow_urls", url)
+
+    def allow_scheme(self, scheme: str) -> Policy:
+        """Any URL of that scheme. Others than file, http and https are of use to loaders."""
+        return self._with("allow_scheme", scheme)
+
+    def allow_host(self, name: str) -> Policy:
+        """From the first one on, of URLs with a host only those of the hosts named.
+
+        ``*.example.org`` stands for every name that ends so.
+        """
+        return self._with("allow_host", name)
+
+    def forbid_local_addresses(self) -> Policy:
+        """Nothing is fetched from servers at addresses that are not of the public network."""
+        return self._with("forbid_local_addresses")
+
+    def __repr__(self) -> str:
+        calls = [f".{name}({argument!r})" if argument else f".{name}()" for name, argument in self.rules]
+        return "Policy" + ("" if calls and calls[0] == ".deny()" else "()") + "".join(calls)
+
+
+class Resource(NamedTuple):
+    """What a loader answers when bytes alone do not say all."""
+
+    data: Union[bytes, str]
+    #: ``text/html`` makes a document an HTML one; without, the path of the URL decides.
+    mime_type: Optional[str] = None
+    #: Of HTTP: with any other than 200 and 304 there is no resource.
+    status: Optional[int] = None
+    #: Where redirects ended; information only.
+    url: Optional[str] = None
+
+
+class Loader(Protocol):
+    """Fetches in place of the library, for the URLs that the policy allows.
+
+    ``purpose`` is "document", "module", "body" or "stylesheet". None says that there is no such
+    resource; an exception ends the evaluation and is raised there. A loader may be called from
+    several threads.
+    """
+
+    def __call__(self, url: str, purpose: str) -> Union[None, bytes, str, Resource]:
+        ...
+
+
+Modules = Union[Mapping[str, str], Callable[[str], Union[None, bytes, str]]]
+Trace = Callable[[str, Result], object]
+Missing = Callable[[str, str], object]
+
+
+@dataclass(frozen=True)
+class Settings:
+    """The keywords that compile and Context take."""
+
+    seconds: Optional[float] = None
+    memory: Optional[int] = None
+    policy: Policy = Policy()
+    url: Optional[str] = None
+    namespaces: Optional[Mapping[str, str]] = None
+    cancellation: Optional[Cancellation] = None
+    loader: Optional[Loader] = None
+    modules: Optional[Modules] = None
+    trace: Optional[Trace] = None
+    missing: Optional[Missing] = None
+
+    def base(self) -> str:
+        """What relative references of a query are resolved against."""
+        return _working_folder() if self.url is None else self.url
+
+    def made(self) -> _xquery.Settings:
+        """The same for the library."""
+        base = self.base()
+        modules = self.modules
+        if isinstance(modules, Mapping):
+            modules = _found_in(modules, base)
+        return _xquery.Settings(
+            seconds=self.seconds,
+            memory=self.memory,
+            policy=self.policy.rules,
+            url=base,
+            namespaces=dict(self.namespaces or {}),
+            cancellation=self.cancellation,
+            loader=self.loader,
+            modules=modules,
+            trace=self.trace,
+            missing=self.missing,
+        )
+
+    def given(self) -> Dict[str, Any]:
+        """Those that are not what they are without being given."""
+        values = ((field, getattr(self, field.name)) for field in fields(self))
+        return {field.name: value for field, value in values if value != field.default}
+
+
+def _working_folder() -> str:
+    try:
+        return _xquery.file_url(b"./") or ""
+    except OSError:
+        return ""
+
+
+def _found_in(modules: Mapping[str, str], base: str) -> Callable[[str], Optional[str]]:
+    texts = {_xquery.resolve(location, base) or location: text for location, text in modules.items()}
+    return texts.get
