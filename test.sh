@@ -15,4 +15,7 @@ trap 'rm -f "$log"' EXIT
 (cd "$top" && ctest --preset "$preset" -j "$jobs" --no-tests=error "$@") | tee "$log"
 status=${PIPESTATUS[0]}
 grep -E 'tests? failed out of' "$log"
+# The closing lines of the tests that pytest ran.
+grep -hE '^[0-9]+ (passed|failed|skipped).* in [0-9.]+s' \
+  "$top/build/$preset/Testing/Temporary/LastTest.log" 2>/dev/null
 exit "$status"

@@ -46,7 +46,7 @@ def to_lxml(node: Node) -> Any:
     >>> xquery.to_lxml(xquery.parse("<a><b/></a>").find("/a/b")).tag
     'b'
     """
-    from lxml import etree  # type: ignore[import]
+    from lxml import etree
 
     if node.kind not in ("document", "element", "comment", "processing-instruction"):
         raise TypeError(f"lxml has no trees for nodes of the kind {node.kind}")

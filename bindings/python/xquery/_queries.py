@@ -390,6 +390,8 @@ class Context:
 def _query_from(query: Union[str, os.PathLike[str]], settings: Settings) -> Query:
     if isinstance(query, str):
         return Query(query, settings)
+    if not isinstance(query, os.PathLike):
+        raise TypeError(f"a query is a str or a path, not {type(query).__name__}")
     with open(query, encoding="utf-8-sig", newline="") as file:
         text = file.read()
     if settings.url is None:
@@ -487,9 +489,12 @@ def release_memory() -> None:
 def _fetched(url: str, settings: Settings) -> bytes:
     """The bytes that are found at a URL; DocumentError where there are none."""
     bodies = Query("declare variable $url external; ext:uri-body($url)", settings)
-    found = bodies.evaluate(url=url).first()
-    if found is not None:
-        return bytes(found)
+    try:
+        return bytes(bodies.evaluate(url=url).one())
+    except Error as error:
+        # The function says so of a resource that there is not; which reason there is, others say.
+        if error.number != 17:
+            raise
     reasons: List[str] = []
     again = replace(settings, missing=lambda missing, reason: reasons.append(reason))
     Query("declare variable $url external; doc($url)", again).evaluate(url=url)

@@ -1,0 +1,132 @@
+"""What is left behind: by documents, by cycles, by the end of the interpreter."""
+
+from __future__ import annotations
+
+import gc
+import os
+import subprocess
+import weakref
+from pathlib import Path
+from typing import Any, Callable, List
+
+import xquery
+
+Run = Callable[[str], "subprocess.CompletedProcess[str]"]
+
+
+def resident() -> int:
+    """Bytes of memory that the process has."""
+    gc.collect()
+    xquery.release_memory()
+    with open("/proc/self/statm") as file:
+        return int(file.readline().split()[1]) * os.sysconf("SC_PAGE_SIZE")
+
+
+def test_ten_thousand_documents_leave_nothing() -> None:
+    data = Path("examples/books.xml").read_bytes()
+    query = xquery.compile("declare variable $n external; //title, <a n='{$n}'/>, //price/text()")
+
+    def use(count: int) -> None:
+        for number in range(count):
+            document = xquery.parse(data)
+            items = query.evaluate(document, n=number)
+            assert len(items) == 9 and items[4].get("n") == str(number)
+            [node.parent for node in document.walk()]
+
+    use(1000)
+    before = resident()
+    use(10_000)
+    # A document takes some kilobytes: a leak of each would be many times as much.
+    assert resident() - before < 4 << 20
+
+
+def test_failures_leave_nothing() -> None:
+    query = xquery.compile("declare variable $v external; $v idiv 0")
+
+    def use(count: int) -> None:
+        for number in range(count):
+            for ask in (
+                lambda: query.evaluate(v=number),
+                lambda: query.evaluate(v=object()),
+                lambda: xquery.parse("<a>" + "<b>" * 50),
+                lambda: xquery.compile("1 +"),
+                lambda: xquery.query("doc('own:a')"),
+            ):
+                try:
+                    ask()
+                except (xquery.Error, TypeError, xquery.MissingDocumentWarning):
+                    pass
+
+    use(300)
+    before = resident()
+    use(3000)
+    assert resident() - before < 4 << 20
+
+
+def test_cycles_are_collected() -> None:
+    class Loader:
+        query: Any = None
+
+        def __call__(self, url: str, purpose: str) -> bytes:
+            return b"<a/>"
+
+    gone: List[Any] = []
+    for keyword in ("loader", "trace", "missing", "modules"):
+        loader = Loader()
+        loader.query = xquery.compile("1", **{keyword: loader})  # type: ignore[arg-type]
+        loader.query.evaluate()
+        gone.append(weakref.ref(loader))
+        context = xquery.Context(**{keyword: loader})  # type: ignore[arg-type]
+        context.evaluate("doc('http://example.org/')" if keyword == "loader" else "1")
+        loader.context = context  # type: ignore[attr-defined]
+        del loader, context
+    gc.collect()
+    assert [reference() for reference in gone] == [None] * 4
+
+
+def test_a_query_is_gone_with_its_last_reference() -> None:
+    query = xquery.compile("1")
+    gone = weakref.ref(query)
+    query.plan()
+    del query
+    assert gone() is None
+
+
+def test_the_interpreter_ends_with_everything_alive(run_python: Run) -> None:
+    done = run_python(
+        "import xquery, threading\n"
+        "document = xquery.parse('<a><b/></a>')\n"
+        "kept = [document, document.find('/a'), xquery.query('1 to 10'), iter(document)]\n"
+        "context = xquery.Context(loader=lambda url, purpose: b'<a/>')\n"
+        "context.evaluate(\"doc('http://example.org/')\")\n"
+        "class Cycle: pass\n"
+        "cycle = Cycle(); cycle.cycle = cycle; cycle.kept = kept\n"
+        "cycle.query = xquery.compile('1', trace=lambda *a: cycle)\n"
+        "print('done')\n"
+    )
+    assert (done.returncode, done.stdout, done.stderr) == (0, "done\n", "")
+
+
+def test_the_interpreter_ends_while_a_thread_evaluates(run_python: Run) -> None:
+    done = run_python(
+        "import xquery, threading, time\n"
+        "query = xquery.compile('count(for $i in 1 to 1000000, $j in 1 to 1000000 return $i)')\n"
+        "threading.Thread(target=query.evaluate, daemon=True).start()\n"
+        "time.sleep(0.2)\n"
+        "print('done')\n"
+    )
+    assert (done.returncode, done.stdout) == (0, "done\n"), done.stderr
+
+
+def test_the_interpreter_ends_while_a_loader_is_asked(run_python: Run) -> None:
+    done = run_python(
+        "import xquery, threading, time\n"
+        "def load(url, purpose):\n"
+        "    time.sleep(1)\n"
+        "query = xquery.compile(\"doc('http://example.org/')\", loader=load, seconds=0.1)\n"
+        "try:\n"
+        "    query.evaluate()\n"
+        "except xquery.LimitError:\n"
+        "    print('done')\n"
+    )
+    assert (done.returncode, done.stdout) == (0, "done\n"), done.stderr
