@@ -137,6 +137,7 @@ class Stream {
     _internal.setContextItem(records.document(), 1);
     const uint32_t references = records.references();
     const auto receive = [&](const NSXMLElement&) {
+      if (_input.beforeRecord) _input.beforeRecord(records.elementsKept());
       if (!evaluateRecord(folding)) return false;
       _internal._setInScopeVariables(nullptr);
       _internal.clearKept();

@@ -1,5 +1,6 @@
 #include "Platform/Reading/XMLRecordFilter.h"
 
+#include <algorithm>
 #include <bit>
 
 namespace xquery {
@@ -21,6 +22,11 @@ uint64_t XMLRecordFilter::enter(const NSXMLElement* element) const {
   return matched;
 }
 
+void XMLRecordFilter::leave() {
+  _levels.pop_back();
+  _elementsKept = std::min(_elementsKept, elementsAbove());
+}
+
 const NSXMLElement* XMLRecordFilter::completeRecord() {
   _recordDepth = 0;
   _tree.endOpenNodes();
@@ -28,7 +34,7 @@ const NSXMLElement* XMLRecordFilter::completeRecord() {
 }
 
 const NSXMLElement* XMLRecordFilter::lookOutside(size_t depthBefore, size_t depth) {
-  if (depth < depthBefore) _levels.pop_back();
+  if (depth < depthBefore) leave();
   const bool isOpen = depth > depthBefore;
   const NSXMLNode* const added = isOpen ? _tree.current() : _tree.current()->firstChild();
   const auto* element = depth < depthBefore ? nullptr : dyn_cast<NSXMLElement>(added);

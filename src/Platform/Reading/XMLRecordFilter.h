@@ -24,7 +24,12 @@ class XMLRecordFilter {
     if (_recordDepth == 0) return lookOutside(depthBefore, depth);
     return depth < _recordDepth ? completeRecord() : nullptr;
   }
-  void dropRecord() { _tree.backTo(_levels.back().mark); }
+  void dropRecord() {
+    _tree.backTo(_levels.back().mark);
+    _elementsKept = elementsAbove();
+  }
+  // Of the elements above a record that is complete: how many were above the record before it too.
+  size_t elementsKept() const { return _elementsKept; }
 
  private:
   // Of the document and each open element outside of records: where to go back to, and how many
@@ -37,11 +42,14 @@ class XMLRecordFilter {
   const NSXMLElement* lookOutside(size_t depthBefore, size_t depth);
   const NSXMLElement* completeRecord();
   uint64_t enter(const NSXMLElement* element) const;
+  void leave();
+  size_t elementsAbove() const { return _levels.size() - 1; }
 
   ReadTree& _tree;
   const std::span<const XMLRecordStep> _path;
   std::vector<Level, ValueAllocator<Level>> _levels;
   size_t _recordDepth = 0;  // of the record that is being read; 0 outside
+  size_t _elementsKept = 0;
 };
 
 }  // namespace xquery

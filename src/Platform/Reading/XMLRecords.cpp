@@ -115,6 +115,7 @@ class XMLRecords::Reading {
 
   bool read(const Receiver& receive, NSXMLParseError& error);
   NSXMLDocument* document() const { return _document.get(); }
+  size_t elementsKept() const { return _filter.elementsKept(); }
 
  private:
   enum class State : uint8_t { Record, AtEnd, NotTaken };
@@ -238,6 +239,10 @@ bool XMLRecords::read(const Receiver& receive, NSXMLParseError& error) {
 
 uint32_t XMLRecords::references() const {
   return __atomic_load_n(&NSXMLTree::of(document())->references, __ATOMIC_RELAXED);
+}
+
+size_t XMLRecords::elementsKept() const {
+  return _reading->elementsKept();
 }
 
 NSXMLDocument* XMLRecords::document() const {

@@ -44,6 +44,10 @@ class XMLRecords {
   // that. What the receiver throws is thrown on.
   [[nodiscard]] bool read(const Receiver& receive, NSXMLParseError& error);
 
+  // Within the receiver: how many of the elements above the record are those that were above the
+  // record before, from the document element on. Others may lie in the same places with the same
+  // names.
+  size_t elementsKept() const;
   // Above the records; the same all the time.
   NSXMLDocument* document() const;
   // How many references to the document, its nodes and their texts there are, this object's

@@ -5,7 +5,8 @@
 // not yet have in scope:
 //
 //   - its own declarations, in their order, except those that contradict the element's own name;
-//   - for the topmost element, those in scope in the tree above that names below it use;
+//   - for the topmost element that is written, those in scope in the tree above that names below it
+//     use; none where the text will stand within the start tags of the elements above;
 //   - those that its name and the names of its attributes still lack. An attribute whose prefix
 //     means something else here gets a prefix that is free.
 //
@@ -219,6 +220,9 @@ class Serializer {
   Serializer(const NSXMLNode* root, XMLOutput& out, Lines lines = Lines::AsTheyAre)
       : _root(root), _out(out), _lines(lines) {}
   void run();
+  // What is written will stand within the start tags of the elements above.
+  void standInPlace();
+  void runStartTag();
 
  private:
   void open(const NSXMLNode* node);
@@ -228,6 +232,7 @@ class Serializer {
   void startLine(size_t depth);
   void writeLeaf(const NSXMLNode* node);
   void writeStartTag(const NSXMLElement* element);
+  void writeOpenedTag(const NSXMLElement* element, NSStringView prefix);
   void writeName(const NSXMLNode* element, NSStringView prefix);
   void writeAttribute(NSStringView prefix, NSStringView localName, NSStringView value);
   void writeDeclaration(const Declaration& declaration);
@@ -251,6 +256,7 @@ class Serializer {
   const NSXMLNode* _root;
   XMLOutput& _out;
   const Lines _lines;
+  bool _isInPlace = false;
   Layout _layout;  // where lines are indented
   NamespaceScope _scope;
   std::vector<Declaration> _declared;         // in the start tag at hand
@@ -261,6 +267,23 @@ class Serializer {
   std::map<std::string, NSStringView> _madePrefixes;  // by URI
   std::deque<std::string> _madeTexts;
 };
+
+void Serializer::standInPlace() {
+  _isInPlace = true;
+  std::vector<const NSXMLElement*> above;
+  for (const NSXMLNode* node = _root->parent(); node; node = node->parent()) {
+    checkWork();
+    if (const auto* element = dyn_cast<NSXMLElement>(node)) above.push_back(element);
+  }
+  for (auto each = above.rbegin(); each != above.rend(); ++each) declareFor(*each);
+}
+
+void Serializer::runStartTag() {
+  const auto* element = cast<NSXMLElement>(_root);
+  writeOpenedTag(element, declareFor(element));
+  _out.write('>');
+  _out.flush();
+}
 
 void Serializer::run() {
   const NSXMLNode* node = _root;
@@ -391,14 +414,13 @@ void Serializer::writeDeclaration(const Declaration& declaration) {
   }
 }
 
-void Serializer::writeStartTag(const NSXMLElement* element) {
-  const NSStringView prefix = declareFor(element);
-  const bool isRenamed = !prefix.equals(element->prefixView());
+// All of it but its end.
+void Serializer::writeOpenedTag(const NSXMLElement* element, NSStringView prefix) {
   _out.write('<');
-  if (isRenamed) {
-    writeName(element, prefix);
-  } else {
+  if (prefix.equals(element->prefixView())) {
     _out.write(element->nameView());
+  } else {
+    writeName(element, prefix);
   }
   for (const Declaration& declaration : _declared) {
     _out.write(' ');
@@ -411,9 +433,14 @@ void Serializer::writeStartTag(const NSXMLElement* element) {
     writeAttribute(attribute.needed.prefix, attribute.node->localNameView(),
                    attribute.node->textView());
   }
+}
+
+void Serializer::writeStartTag(const NSXMLElement* element) {
+  const NSStringView prefix = declareFor(element);
+  writeOpenedTag(element, prefix);
   if (element->firstChild()) {
     _out.write('>');
-    if (isRenamed) _renamed.emplace_back(element, prefix);
+    if (!prefix.equals(element->prefixView())) _renamed.emplace_back(element, prefix);
   } else {
     _out.write("/>");
     _scope.leave(element);
@@ -533,7 +560,7 @@ NSStringView Serializer::declareFor(const NSXMLElement* element) {
   _declared.clear();
   const Declaration needed = neededFor(element);
   declareOwn(element, needed);
-  if (element == _root) declareInherited(element, needed);
+  if (element == _root && !_isInPlace) declareInherited(element, needed);
   const NSStringView prefix = prefixForName(element, needed);
   chooseAttributes(element);
   WorkPacer pacer;
@@ -594,6 +621,24 @@ void XQueryWriteIndentedXML(const NSXMLNode& node,
   std::string buffer;
   XMLOutput out(buffer, &write);
   Serializer(&node, out, Lines::Indented).run();
+}
+
+void XQueryWriteStartTag(const NSXMLElement& element,
+                         const std::function<bool(std::string_view)>& write) {
+  std::string buffer;
+  XMLOutput out(buffer, &write);
+  Serializer serializer(&element, out);
+  serializer.standInPlace();
+  serializer.runStartTag();
+}
+
+void XQueryWriteXMLInPlace(const NSXMLNode& node,
+                           const std::function<bool(std::string_view)>& write) {
+  std::string buffer;
+  XMLOutput out(buffer, &write);
+  Serializer serializer(&node, out);
+  serializer.standInPlace();
+  serializer.run();
 }
 
 Ref<NSString> NSXMLNode::XMLString() const {

@@ -388,5 +388,24 @@ TEST(Stream, MayStillBeEvaluatedOverAWholeDocument) {
   EXPECT_EQ(shownItem(*items->objectAtIndex(0)), "xs:integer:3");
 }
 
+// Of an element above that looks like the one before it nothing else tells.
+TEST(Stream, TellsWhichElementsAboveARecordAreTheSame) {
+  std::vector<std::string> heard;
+  XQueryStreamInput input =
+      inputOf("<a><b><c/><c/></b><b><x/><c><c/></c></b><b/><d><c/></d><c/></a>");
+  input.beforeRecord = [&](size_t kept) { heard.push_back(std::to_string(kept)); };
+  XQueryStreamFailure failure;
+  const auto context = XQueryContext::xqueryContext();
+  EXPECT_TRUE(context->evaluateStream(
+      *compiled("//c"), {}, input,
+      [&](const Value&) {
+        heard.push_back("item");
+        return true;
+      },
+      failure));
+  EXPECT_EQ(heard, (std::vector<std::string>{"0", "item", "2", "item", "1", "item", "item", "1",
+                                             "item", "1", "item"}));
+}
+
 }  // namespace
 }  // namespace xquery

@@ -7,6 +7,7 @@
 #include <gtest/gtest.h>
 
 #include <new>
+#include <set>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -59,12 +60,31 @@ std::string shown(const NSXMLElement* record) {
   return text + "\n";
 }
 
+std::string shownKept(size_t elementsKept) {
+  return std::to_string(elementsKept) + " kept: ";
+}
+
+// The elements that both are in.
+size_t elementsAroundBoth(const NSXMLNode* a, const NSXMLNode* b) {
+  std::set<const NSXMLNode*> around;
+  for (const NSXMLNode* node = a ? a->parent() : nullptr; node; node = node->parent()) {
+    if (isa<NSXMLElement>(node)) around.insert(node);
+  }
+  size_t count = 0;
+  for (const NSXMLNode* node = b->parent(); node; node = node->parent()) {
+    count += around.contains(node);
+  }
+  return count;
+}
+
 std::string expected(const std::string& text, const Path& path, uint32_t options) {
   std::string all;
+  const NSXMLNode* last = nullptr;
   const auto document = readingtest::read(text, XMLWay::LibXML, options);
   for (const NSXMLNode* node = document.get(); node;) {
     if (isFoundBy(path.steps, path.steps.size(), node)) {
-      all += shown(cast<NSXMLElement>(node));
+      all += shownKept(elementsAroundBoth(last, node)) + shown(cast<NSXMLElement>(node));
+      last = node;
       node = NSXMLTree::endOfSubtree(node);
     } else {
       node = node->nextNode();
@@ -85,7 +105,7 @@ std::string actual(TextSource& source, const Path& path, uint32_t options) {
   const auto receive = [&](const NSXMLElement& record) {
     EXPECT_EQ(record.rootDocument(), records.document());
     EXPECT_FALSE(record.nextSibling() || record.previousSibling());
-    all += shown(&record);
+    all += shownKept(records.elementsKept()) + shown(&record);
     return true;
   };
   if (records.read(receive, error)) return all;
@@ -112,6 +132,7 @@ const std::string documents[] = {
     "</b>\n</a>",
     "<a xmlns:p='u'><b><c p:i='1' xmlns:q='v'><q:d/></c></b><b><c xmlns='w'/><c xmlns:q='v' "
     "q:i='2'/></b></a>",
+    "<a><b><c/><c/></b><b><c/><x/></b><x/><b/><b><c/></b><x><b><c/></b></x></a>",
     "<a>&lt;<b>\xC3\xA9<c>\xC3\xA9</c></b>&#233;<b c='&#233;'/></a>",
 };
 
@@ -249,7 +270,8 @@ TEST(XMLRecords, MayBeDeep) {
 TEST(XMLRecords, BeforeAnErrorAreHandedOut) {
   TextSource source("<a><b>1</b>\n<b>2</b><b>3</a>");
   EXPECT_EQ(actual(source, Path("/a/b"), 0),
-            "a/<b>1</b>\na/<b>2</b>\n2:17: Opening and ending tag mismatch: b line 2 and a");
+            "0 kept: a/<b>1</b>\n1 kept: a/<b>2</b>\n2:17: Opening and ending tag mismatch: b line "
+            "2 and a");
 }
 
 TEST(XMLRecords, EndWhenTheReceiverHasEnough) {

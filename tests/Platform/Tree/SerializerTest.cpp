@@ -1,10 +1,12 @@
 #include "Platform/Base/ProcessorTime.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/XMLTestSupport.h"
+#include "xquery/Serializing.h"
 #include "xquery/XMLNode.h"
 
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <random>
 #include <set>
 #include <string>
@@ -417,6 +419,65 @@ TEST(XMLSerializer, WritingInPiecesGivesTheSame) {
   size_t calls = 0;
   document->writeXML([&](std::string_view) { return ++calls < 3; });
   EXPECT_EQ(calls, 3u);
+}
+
+// --- part by part --------------------------------------------------------------------------------
+
+std::string gathered(
+    const std::function<void(const std::function<bool(std::string_view)>&)>& write) {
+  std::string text;
+  write([&](std::string_view piece) {
+    text += piece;
+    return true;
+  });
+  return text;
+}
+
+// As a host writes it that looks at each node.
+std::string inParts(const NSXMLNode& node, bool asWholes) {
+  const auto* element = dyn_cast<NSXMLElement>(&node);
+  const bool isPart = !element || !element->firstChild();
+  if (isPart || (asWholes && node.parent()->parent())) {
+    return gathered([&](const auto& write) { XQueryWriteXMLInPlace(node, write); });
+  }
+  std::string text = gathered([&](const auto& write) { XQueryWriteStartTag(*element, write); });
+  for (const NSXMLNode* child = node.firstChild(); child; child = child->nextSibling()) {
+    text += inParts(*child, asWholes);
+  }
+  return text + "</" + element->nameView().utf8() + ">";
+}
+
+TEST(XMLSerializer, PartsComeToTheWhole) {
+  for (const char* text : {
+           "<a>text<b/>more</a>",
+           "<a x=\"1 &lt; 2\" y=\"\"><b><c z=\"&quot;\">t</c></b></a>",
+           "<a xmlns=\"u\" xmlns:p=\"v\" xmlns:q=\"w\"><p:b p:x=\"1\">q:t</p:b><c q:y=\"2\"/></a>",
+           "<p:a xmlns:p=\"u\"><b><p:c xmlns:p=\"v\"><p:d/></p:c></b><p:e "
+           "xmlns:p=\"u\">t</p:e></p:a>",
+           "<a xmlns=\"u\"><b xmlns=\"\"><c xmlns=\"u\"><d/></c><e/></b></a>",
+           "<a><!--c--><b xml:lang=\"en\"><?p q?><![CDATA[<x>]]></b></a>",
+       }) {
+    const auto document = parsed(text, keepAll);
+    EXPECT_EQ(inParts(*document->rootElement(), false), text);
+    EXPECT_EQ(inParts(*document->rootElement(), true), text);
+  }
+}
+
+TEST(XMLSerializer, AStartTagIsNeverThatOfAnEmptyElement) {
+  const auto document = parsed("<a><b i='1'/></a>");
+  const auto* element = cast<NSXMLElement>(document->rootElement()->firstChild());
+  EXPECT_EQ(gathered([&](const auto& write) { XQueryWriteStartTag(*element, write); }),
+            "<b i=\"1\">");
+}
+
+TEST(XMLSerializer, PartsEndWhenNobodyTakesMore) {
+  const auto document = parsed("<a><b>" + std::string(300'000, 'x') + "</b></a>");
+  int calls = 0;
+  XQueryWriteXMLInPlace(*document->rootElement()->firstChild(), [&](std::string_view) {
+    ++calls;
+    return false;
+  });
+  EXPECT_EQ(calls, 1);
 }
 
 }  // namespace
