@@ -85,7 +85,7 @@ bool ResultFile::openBeside(const std::string& target, const struct stat* old) {
   constexpr int mostNames = 1000;  // that others may have taken
   for (int n = 0; n < mostNames && _file < 0; ++n) {
     _temporary = (folder / (start + std::to_string(n))).string();
-    _file = ::open(_temporary.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, mode);
+    _file = makeUntilEnd(_temporary, mode);
     if (_file < 0 && errno != EEXIST) break;
   }
   if (_file < 0) {
@@ -93,7 +93,6 @@ bool ResultFile::openBeside(const std::string& target, const struct stat* old) {
     return fail(old ? "no new file can be made beside it: " : "");
   }
   _target = target;
-  removeAtEnd(_temporary);
   if (old) inheritFrom(*old);
   return true;
 }

@@ -8,6 +8,7 @@
 #include <limits.h>
 #include <poll.h>
 #include <pthread.h>
+#include <sched.h>
 #include <termios.h>
 #include <unistd.h>
 
@@ -20,6 +21,25 @@ struct Temporary {
   std::atomic<bool> isThere = false;
 };
 Temporary temporaries[2];
+
+// Held while a file is made and put among these, and for good by a process that ends, whose other
+// threads go on for a while and would make one more.
+std::atomic_flag areTemporariesHeld;
+std::atomic<bool> isEnding = false;
+
+void holdTemporaries() {
+  while (areTemporariesHeld.test_and_set()) sched_yield();
+}
+
+void registerTemporary(const std::string& path) {
+  for (Temporary& each : temporaries) {
+    if (each.isThere || path.size() >= sizeof each.path) continue;
+    std::memcpy(each.path, path.c_str(), path.size() + 1);
+    each.isThere = true;
+    return;
+  }
+}
+
 termios terminal;
 std::atomic<bool> hasTerminal = false;
 
@@ -36,13 +56,19 @@ void prepareStandardStreams() {
   std::signal(SIGXFSZ, SIG_IGN);
 }
 
-void removeAtEnd(const std::string& path) {
-  for (Temporary& each : temporaries) {
-    if (each.isThere || path.size() >= sizeof each.path) continue;
-    std::memcpy(each.path, path.c_str(), path.size() + 1);
-    each.isThere = true;
-    return;
-  }
+// No signal interrupts the thread meanwhile, whose handler would wait for it.
+int makeUntilEnd(const std::string& path, mode_t mode) {
+  sigset_t all, before;
+  sigfillset(&all);
+  pthread_sigmask(SIG_SETMASK, &all, &before);
+  holdTemporaries();
+  const int file = open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, mode);
+  const int error = errno;
+  if (file >= 0) registerTemporary(path);
+  areTemporariesHeld.clear();
+  pthread_sigmask(SIG_SETMASK, &before, nullptr);
+  errno = error;
+  return file;
 }
 
 void keepAtEnd(const std::string& path) {
@@ -60,6 +86,8 @@ void endOfClosedPipe() {
 }
 
 void endBySignal(int signal) {
+  // A second signal may come while the first one waits.
+  if (!isEnding.exchange(true)) holdTemporaries();
   for (const Temporary& each : temporaries) {
     if (each.isThere) unlink(each.path);
   }

@@ -3,6 +3,7 @@
 
 #include <string>
 #include <string_view>
+#include <sys/types.h>
 
 namespace cli {
 
@@ -19,9 +20,10 @@ void prepareStandardStreams();
 // whose reader had enough; without a message.
 [[noreturn]] void endOfClosedPipe();
 
-// A file that must not be left behind by a process that ends so, of which there may be two at a
-// time; and one that need not be removed any more.
-void removeAtEnd(const std::string& path);
+// Makes a file that must not be left behind by a process that ends so, of which there may be two at
+// a time; answers its descriptor, and -1 with errno where there is one of that name. And one that
+// need not be removed any more.
+[[nodiscard]] int makeUntilEnd(const std::string& path, mode_t mode);
 void keepAtEnd(const std::string& path);
 
 // The terminal on standard input is left by a process that ends so as it is now.
