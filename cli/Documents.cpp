@@ -98,6 +98,11 @@ Failure readingFailure(const std::string& path, const NSXMLParseError& error) {
           {}};
 }
 
+Failure writingFailure(const std::optional<std::string>& path, const std::string& reason) {
+  const std::string name = visibleName(path.value_or("standard output"));
+  return {StatusInput, "xquery: cannot write " + name + ": " + reason, {}};
+}
+
 DocumentProgress::DocumentProgress(const Options& options, const std::string& path) {
   if (showsProgress(options)) _line.emplace(shownName(path));
 }

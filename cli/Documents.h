@@ -38,6 +38,8 @@ xquery::Ref<xquery::NSXMLDocument> readInput(const Options& options, const std::
 // How a document is to be read, and what there is to say of one that could not be.
 uint32_t readingMode(const Options& options);
 Failure readingFailure(const std::string& path, const xquery::NSXMLParseError& error);
+// What there is to say where a file, or without a path standard output, could not be written.
+Failure writingFailure(const std::optional<std::string>& path, const std::string& reason);
 
 // The line that shows how far the reading of an input is, while it exists and where one is shown.
 class DocumentProgress {

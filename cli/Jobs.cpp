@@ -90,8 +90,7 @@ Status Jobs::run() {
   for (const pthread_t thread : threads) pthread_join(thread, nullptr);
   endIfInterrupted();
   if (_results.finish(_parts)) return status();
-  const std::string name = visibleName(_options.outputFile.value_or("standard output"));
-  throw Failure{StatusInput, "xquery: cannot write " + name + ": " + _results.error(), {}};
+  throw writingFailure(_options.outputFile, _results.error());
 }
 
 Status Jobs::status() {

@@ -5,6 +5,7 @@
 #include "Messages.h"
 #include "OptionsTable.h"
 #include "Output.h"
+#include "Splitting.h"
 #include "Streaming.h"
 #include "Streams.h"
 
@@ -39,7 +40,8 @@ class Help : public CLI::Formatter {
   std::string make_usage(const CLI::App*, std::string) const override {
     return "Usage: xquery [options] QUERYFILE [INPUT...]\n"
            "       xquery [options] -e QUERY [INPUT...]\n"
-           "       xquery [options] [INPUT.xml]\n";
+           "       xquery [options] [INPUT.xml]\n"
+           "       xquery [options] --split PATH --records N INPUT FOLDER\n";
   }
   // The value belongs to the name where it may be left out.
   std::string make_option_name(const CLI::Option* option, bool isPositional) const override {
@@ -153,6 +155,7 @@ void checkSession(const Options& options) {
 // Gives the positional arguments their meaning.
 void interpretArguments(const CLI::App& app, Options& options) {
   options.inputs = given(app, "arguments");
+  if (options.splitPath || options.records > 0) return interpretSplit(options);
   if (options.queryText) return;
   options.isSession = beginsSession(options);
   if (options.isSession) return;

@@ -51,6 +51,9 @@ struct Options {
   bool stripSpace = false;
   bool time = false;
   bool stream = false;                           // there is an input then, or a plan is asked for
+  std::optional<std::string> splitPath;          // the query then, and `stream` is set
+  std::optional<std::string> splitFolder;        // where the pieces go
+  unsigned records = 0;                          // in each piece
   std::optional<xquery::XQueryPlanFormat> plan;  // to be shown instead of the result
   std::optional<std::string> profileFile;
   unsigned repeat = 1;

@@ -208,6 +208,12 @@ constexpr OptionRow rows[] = {
      "Evaluate INPUT record by record, in the memory of one record, and write each item as it is "
      "found; a query for which that cannot be done is refused",
      set<&Options::stream>},
+    {ofInput, "--split", Takes::Value, "PATH", Offers::Nothing,
+     "Cut INPUT into documents of as many of the elements that PATH gives as --records says, and "
+     "name them; the last argument is the FOLDER they are written to",
+     take<&Options::splitPath>},
+    {ofInput, "--records", Takes::Value, "N", Offers::Nothing, "That number, with --split",
+     count<&Options::records, 1'000'000'000>},
     {ofResult, "--types", Takes::Nothing, "", Offers::Nothing,
      "Put the type and a tab before each item", set<&Options::types>},
     {ofResult, "--as", Takes::Value, "lines|xml|html|json|text", Offers::Words,

@@ -10,6 +10,7 @@
 #include "Reports.h"
 #include "Session.h"
 #include "Signals.h"
+#include "Splitting.h"
 #include "Streaming.h"
 #include "Streams.h"
 #include "Timing.h"
@@ -25,8 +26,7 @@ void printPlan(const Options& options, const XQuery& query) {
   const std::string plan = options.stream ? XQueryStreamDescription(query)
                                           : query.planDescription(*options.plan)->utf8();
   if (output.open(options.outputFile) && output.append(plan) && output.finish()) return;
-  const std::string name = visibleName(options.outputFile.value_or("standard output"));
-  throw Failure{StatusInput, "xquery: cannot write " + name + ": " + output.error(), {}};
+  throw writingFailure(options.outputFile, output.error());
 }
 
 // Of a query without errors.
@@ -69,7 +69,8 @@ Status runPhases(const Options& options) {
   }
   const XQueryConstants constants = phases.parse.measure([&] { return bindConstants(options); });
   if (options.stream) {
-    const Status status = runStream(options, *query, constants, phases);
+    const Status status = options.splitPath ? runSplit(options, *query, constants, phases)
+                                            : runStream(options, *query, constants, phases);
     if (options.time && (status == StatusResult || status == StatusFalse)) phases.report(false);
     return status;
   }

@@ -108,10 +108,7 @@ Status Stream::finish(const std::optional<Failure>& failure) {
     beginOnce();
     _part.end();
   }
-  if (!_results.finish(1)) {
-    const std::string name = visibleName(_options.outputFile.value_or("standard output"));
-    throw Failure{StatusInput, "xquery: cannot write " + name + ": " + _results.error(), {}};
-  }
+  if (!_results.finish(1)) throw writingFailure(_options.outputFile, _results.error());
   if (failure) return failure->status;
   return _options.exitStatus && !_isTrue ? StatusFalse : StatusResult;
 }

@@ -1,0 +1,63 @@
+// The documents that a large one is cut into, "part-00000001.xml" and so on in one folder.
+//
+// A piece holds its records and, around them, the elements that they are in, with attributes and
+// namespaces, and nothing else. The elements around a record that are those around the record
+// before as well are the same element in the piece; others that look like them are not.
+#pragma once
+
+#include "Output.h"
+#include "xquery/xquery.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <functional>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace cli {
+
+class Pieces {
+ public:
+  // Told the path of each piece once it is whole.
+  using Receiver = std::function<void(const std::string& path)>;
+
+  // In a folder that is there and empty. So many records in each, but for the last.
+  Pieces(std::string folder, uint64_t records, Receiver receive);
+
+  // From here on, only so many of the elements that records are in are those from before.
+  void beginRecord(size_t elementsKept);
+  // An element within the record; nothing happens where it lies in one that was added before, which
+  // holds it already. All of these throw Failure, where the item is no element of the document,
+  // does not come in the order of the document, or cannot be written.
+  void add(const xquery::NSObject& item);
+  // Ends the last piece. Without this it is gone.
+  void finish();
+
+ private:
+  bool isInLast(const xquery::NSXMLElement& element) const;
+  void enter(const std::vector<const xquery::NSXMLElement*>& above);
+  void open();
+  void close();
+  void leaveTo(size_t depth);
+  bool write(std::string_view text) { return _output->append(text); }
+
+  // An element whose start tag has been written; one that is gone by now has no address.
+  struct Open {
+    const xquery::NSXMLElement* element;
+    std::string name;
+  };
+
+  const std::string _folder;
+  const uint64_t _records;
+  const Receiver _receive;
+  uint64_t _number = 0;  // of the piece
+  uint64_t _count = 0;   // of the records in it
+  std::string _path;
+  std::optional<Output> _output;  // where there is a piece that is not whole
+  std::vector<Open> _open;
+  const xquery::NSXMLElement* _last = nullptr;  // that was added within the record
+};
+
+}  // namespace cli

@@ -1,0 +1,149 @@
+#include "Splitting.h"
+
+#include "Documents.h"
+#include "Evaluation.h"
+#include "Inputs.h"
+#include "Messages.h"
+#include "MissingDocuments.h"
+#include "OptionsTable.h"
+#include "Output.h"
+#include "Pieces.h"
+
+#include <filesystem>
+#include <memory>
+#include <optional>
+#include <string>
+#include <system_error>
+#include <utility>
+
+namespace cli {
+namespace {
+
+using namespace xquery;
+
+// What lies in the folder already would be taken for pieces.
+void prepareFolder(const std::string& folder) {
+  std::error_code error;
+  std::filesystem::create_directories(folder, error);
+  if (error) throw writingFailure(folder, error.message());
+  const bool isEmpty = std::filesystem::is_empty(folder, error);
+  if (error) throw writingFailure(folder, error.message());
+  if (!isEmpty) throw writingFailure(folder, "the folder is not empty");
+}
+
+class Split {
+ public:
+  explicit Split(const Options& options)
+      : _options(options),
+        _path(options.inputs.front()),
+        _pieces(*options.splitFolder, options.records,
+                [this](const std::string& path) { tellOfPiece(path); }) {}
+
+  void run(const XQuery& query, const XQueryConstants& constants);
+
+ private:
+  // A stream hears of a failure by false, and ends.
+  template <class Step>
+  bool isDone(const Step& step) {
+    try {
+      step();
+      return true;
+    } catch (const Failure& failure) {
+      _failure = failure;
+      return false;
+    }
+  }
+  void add(const Value& item);
+  void tellOfPiece(const std::string& path);
+  void evaluate(const XQuery& query, const XQueryConstants& constants);
+
+  const Options& _options;
+  const std::string _path;
+  Output _names;
+  Pieces _pieces;
+  std::optional<Failure> _failure;
+};
+
+void Split::run(const XQuery& query, const XQueryConstants& constants) {
+  refuseOutputAsInput(_options, _path);
+  prepareFolder(*_options.splitFolder);
+  if (!_names.open(std::nullopt)) throw writingFailure(std::nullopt, _names.error());
+  evaluate(query, constants);
+  _pieces.finish();
+  if (!_names.finish()) throw writingFailure(std::nullopt, _names.error());
+}
+
+void Split::evaluate(const XQuery& query, const XQueryConstants& constants) {
+  Evaluation evaluation(_options, std::make_shared<MissingDocuments>(_options));
+  DocumentProgress progress(_options, _path);
+  XQueryStreamInput input;
+  input.path = _path;
+  input.options = readingMode(_options);
+  input.progress = progress.callback();
+  input.beforeRecord = [this](size_t elementsKept) { _pieces.beginRecord(elementsKept); };
+  const auto receive = [this](const Value& item) { return isDone([&] { add(item); }); };
+  XQueryStreamFailure failure;
+  const bool isWhole = evaluation.evaluateStream(query, constants, input, receive, failure);
+  if (_failure) throw *_failure;
+  if (isWhole) return;
+  if (!failure.error) throw readingFailure(_path, failure.reading);
+  throw Failure{StatusQueryError, description(*failure.error), {failure.error}};
+}
+
+void Split::add(const Value& item) {
+  if (auto* error = dyn_cast<NSError>(item.get())) {
+    throw Failure{StatusQueryError, description(*error), {Ref<NSError>(error)}};
+  }
+  _pieces.add(*item);
+}
+
+// At once, for whoever works on a piece while the next one is made.
+void Split::tellOfPiece(const std::string& path) {
+  if (_names.append(path + "\n") && _names.flush()) return;
+  throw writingFailure(std::nullopt, _names.error());
+}
+
+void checkOptions(const Options& options) {
+  const std::pair<bool, const char*> wrong[] = {
+      {options.queryText.has_value(), "-e"},
+      {options.filesFrom.has_value(), "--files-from"},
+      {options.html, "--html"},
+      {options.jobs > 0, "--jobs"},
+      {options.repeat > 1, "--repeat"},
+      {options.profileFile.has_value(), "--profile"},
+      {options.outputFile.has_value(), "-o"},
+      {options.format != Format::Lines && options.format != Format::JSON, "--as"},
+      {options.types, "--types"},
+      {options.indent, "--indent"},
+      {options.separator.has_value(), "--separator"},
+      {options.withName, "--with-name"},
+      {options.exitStatus, "--exit-status"},
+  };
+  for (const auto& [isGiven, name] : wrong) {
+    if (isGiven) throw WrongUsage("--split excludes " + std::string(name));
+  }
+}
+
+}  // namespace
+
+void interpretSplit(Options& options) {
+  if (!options.splitPath) throw WrongUsage("--records requires --split PATH");
+  checkOptions(options);
+  if (options.records == 0) throw WrongUsage("--split requires --records N");
+  if (options.inputs.size() != 2) throw WrongUsage("--split requires one INPUT and a FOLDER");
+  options.splitFolder = options.inputs.back();
+  options.inputs.pop_back();
+  options.queryText = options.splitPath;
+  options.stream = true;
+}
+
+Status runSplit(const Options& options, const XQuery& query, const XQueryConstants& constants,
+                Phases& phases) {
+  phases.evaluate.measure([&] {
+    Split(options).run(query, constants);
+    return true;
+  });
+  return StatusResult;
+}
+
+}  // namespace cli
