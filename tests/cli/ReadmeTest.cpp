@@ -3,13 +3,13 @@
 
 #include <gtest/gtest.h>
 
-#include <cstdlib>
 #include <sstream>
 #include <string>
 
 using command::books;
 using command::Outcome;
 using command::readFile;
+using command::TemporaryDirectory;
 
 namespace {
 
@@ -77,19 +77,26 @@ TEST(Readme, TheExampleReportsAnErrorWhereverItStands) {
   }
 }
 
-// Every line of the README that starts the built command, run by a shell in the project's folder.
+// Every line of the README that starts the command, run by a shell in the project's folder. The
+// first of them does it by the script that builds it before.
 TEST(Readme, ItsCommandLinesSucceed) {
   std::istringstream readme(readFile(XQUERY_SOURCE_DIR "/README.md"));
-  const std::string command = "build/release/xquery ";
+  const TemporaryDirectory temporary;
   int lines = 0;
   for (std::string line; std::getline(readme, line);) {
-    if (line.rfind(command, 0) != 0) continue;
-    const std::string script = "cd '" XQUERY_SOURCE_DIR "' && '" XQUERY_BINARY_DIR "/xquery' " +
-                               line.substr(command.size()) + " > /dev/null";
-    EXPECT_EQ(std::system(script.c_str()), 0) << line;
+    std::string arguments;
+    for (const std::string start : {"build/release/xquery ", "./run.sh -"}) {
+      if (line.starts_with(start)) arguments = line.substr(line.find(' '));
+    }
+    if (arguments.empty()) continue;
+    const Outcome outcome = command::shell(
+        "cd '" XQUERY_SOURCE_DIR "' && TMPDIR=\"$1\" \"$0\"" + arguments, {temporary.path("")});
+    EXPECT_EQ(outcome.status, 0) << line;
+    EXPECT_EQ(outcome.err, "") << line;
+    EXPECT_NE(outcome.out, "") << line;
     ++lines;
   }
-  EXPECT_GE(lines, 3);
+  EXPECT_EQ(lines, 10);
 }
 
 }  // namespace
