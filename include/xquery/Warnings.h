@@ -23,6 +23,7 @@ struct XQueryWarning {
   Ref<NSString> module;         // URL of the library module it is in; null for the query itself
   int64_t line = 0;             // in that module, counted from 1; 0 where it is not known
   int64_t column = 0;           // in characters, counted from 1; 0 where it is not known
+  int64_t length = 0;           // of what it is about, in characters; 0 where it is not known
 };
 
 // The warnings of a query that was compiled to be explained, in the order of its text and behind

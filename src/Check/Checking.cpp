@@ -117,6 +117,8 @@ void XQueryChecking::findColumns() {
     if (!cursor.goTo(each.number)) continue;
     each.warning.line = cursor.line();
     each.warning.column = cursor.column();
+    const XQuerySpan span = places.span(each.number);
+    each.warning.length = span.end - span.start;
   }
 }
 

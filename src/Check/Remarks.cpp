@@ -31,7 +31,7 @@ bool mayMakeElements(const XQueryChecking& checking) {
 void tell(XQueryChecking& checking, const XQueryProlog& module, const XQueryRemark& remark) {
   const std::string first = textOf(remark.first);
   const auto warn = [&](ID id, XQueryChecking::Parts parts = {}) {
-    checking.warnAt(module, {remark.line}, id, parts);
+    checking.warnAt(module, {remark.line, remark.place}, id, parts);
   };
   switch (remark.matter) {
     case Matter::EndTag:

@@ -30,11 +30,17 @@ NSObject* XQAtLine(Ref<T> expr, int64_t line) {
   return XQueryParserAutoRelease(std::move(expr));
 }
 
-// Notes what the expressions will not tell; the names may be null.
-inline void XQRemark(XQueryRemark::Matter matter, int64_t line, NSObject* first = nullptr,
-                     NSObject* second = nullptr) {
-  XQueryParser::currentParser()->remark(
-      {matter, line, XQRef<NSString>(first), XQRef<NSString>(second)});
+// Notes what the expressions will not tell of what stands there; the names may be null.
+inline void XQRemarkAt(XQuerySpan span, XQueryRemark::Matter matter, int64_t line,
+                       NSObject* first = nullptr, NSObject* second = nullptr) {
+  XQueryParser& parser = *XQueryParser::currentParser();
+  parser.remark(
+      {matter, line, parser.places()->add(span), XQRef<NSString>(first), XQRef<NSString>(second)});
+}
+
+// The same of the production at work.
+inline void XQRemark(XQueryRemark::Matter matter, int64_t line, NSObject* first = nullptr) {
+  XQRemarkAt(XQueryParser::currentParser()->span(), matter, line, first);
 }
 
 inline NSObject* XQList(NSObject* item) {

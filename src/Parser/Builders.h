@@ -8,6 +8,7 @@
 #pragma once
 
 #include "Expr/Clauses/XQueryFLWOR.h"
+#include "Platform/Base/XQueryPlaces.h"
 #include "xquery/Object.h"
 
 #include <cstdint>
@@ -159,7 +160,7 @@ NSObject* XQSequenceType(NSObject* type, int occurrenceToken);
 NSObject* XQElementConstructor(NSObject* name, NSObject* attributes, NSObject* content,
                                int64_t line);
 // Notes an end tag that has another name than the start tag.
-void XQEndTag(NSObject* startName, NSObject* endName, int64_t line);
+void XQEndTag(NSObject* startName, NSObject* endName, int64_t line, XQuerySpan endNameAt);
 // Notes a reference to a tab or a line end, which an attribute does not keep.
 void XQCharRefInAttribute(char16_t unit, int64_t line);
 NSObject* XQAttributeList(NSObject* item);

@@ -64,9 +64,9 @@ NSObject* XQElementConstructor(NSObject* name, NSObject* attributes, NSObject* c
                   line);
 }
 
-void XQEndTag(NSObject* startName, NSObject* endName, int64_t line) {
+void XQEndTag(NSObject* startName, NSObject* endName, int64_t line, XQuerySpan endNameAt) {
   if (cast<NSString>(startName)->isEqualToString(*cast<NSString>(endName))) return;
-  XQRemark(XQueryRemark::Matter::EndTag, line, startName, endName);
+  XQRemarkAt(endNameAt, XQueryRemark::Matter::EndTag, line, startName, endName);
 }
 
 void XQCharRefInAttribute(char16_t unit, int64_t line) {

@@ -1155,25 +1155,25 @@ DirElemConstructor:
   | kTokenLessThanConstructor kTokenQName DirAttributeList kTokenGreaterThan DirElementContent
         kTokenLessThanSolidus kTokenQName kTokenGreaterThan
       {
-        XQEndTag($2.value, $7.value, $7.line);
+        XQEndTag($2.value, $7.value, $7.line, @7.span);
         $$ = XQValue($1.line, XQElementConstructor($2.value, $3.value, $5.value, $1.line));
       }
   | kTokenLessThanConstructor kTokenQName kTokenGreaterThan DirElementContent kTokenLessThanSolidus
         kTokenQName kTokenGreaterThan
       {
-        XQEndTag($2.value, $6.value, $6.line);
+        XQEndTag($2.value, $6.value, $6.line, @6.span);
         $$ = XQValue($1.line, XQElementConstructor($2.value, nullptr, $4.value, $1.line));
       }
   | kTokenLessThanConstructor kTokenQName DirAttributeList kTokenGreaterThan kTokenLessThanSolidus
         kTokenQName kTokenGreaterThan
       {
-        XQEndTag($2.value, $6.value, $6.line);
+        XQEndTag($2.value, $6.value, $6.line, @6.span);
         $$ = XQValue($1.line, XQElementConstructor($2.value, $3.value, nullptr, $1.line));
       }
   | kTokenLessThanConstructor kTokenQName kTokenGreaterThan kTokenLessThanSolidus kTokenQName
         kTokenGreaterThan
       {
-        XQEndTag($2.value, $5.value, $5.line);
+        XQEndTag($2.value, $5.value, $5.line, @5.span);
         $$ = XQValue($1.line, XQElementConstructor($2.value, nullptr, nullptr, $1.line));
       }
   ;

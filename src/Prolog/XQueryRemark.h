@@ -2,6 +2,7 @@
 // those who check queries.
 #pragma once
 
+#include "Platform/Base/XQueryPlaces.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 
@@ -23,7 +24,8 @@ struct XQueryRemark {
     BaseURI,
   };
   Matter matter;
-  int64_t line;         // counted from 0
+  int64_t line;  // counted from 0
+  XQueryPlaceNumber place;
   Ref<NSString> first;  // the name or the URI that it is about; null for none
   Ref<NSString> second;
 };
