@@ -2,6 +2,7 @@
 
 #include "Context/XQueryContextInternal.h"
 #include "Functions/URI.h"
+#include "Platform/Base/HostFailure.h"
 #include "Platform/Stylesheets/Stylesheet.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryTypeTable.h"
@@ -14,9 +15,19 @@ const NSXMLDocument* documentOf(const Value* arguments, size_t count) {
   return count == 2 ? dyn_cast<NSXMLDocument>(arguments[0].get()) : nullptr;
 }
 
+StylesheetMisses tellingClient(XQueryContext& context) {
+  return [&context](const NSURL& URL, const std::string& reason) {
+    const std::shared_ptr<XQueryClient> client = context.contextClient();
+    if (!client) return;
+    const XQueryMissingDocument missing{withoutCredentials(URL.absoluteString()->utf8()), reason};
+    passingOnHostFailures([&] { client->XQueryClientMissesDocument(missing, context); });
+  };
+}
+
 }  // namespace
 
-// Why a stylesheet gives no result is not told by either.
+// What could not be loaded is told to the client, and nothing else of why a stylesheet gives no
+// result.
 
 Value ext_xslt(const Value* arguments, size_t count, XQueryContext& context) {
   const NSXMLDocument* document = documentOf(arguments, count);
@@ -28,7 +39,8 @@ Value ext_xslt(const Value* arguments, size_t count, XQueryContext& context) {
   const Ref<NSURLLoader> loader = &context._internal().loader();
   std::string ignored;
   return XMLResultOfStylesheet(*document, *cast<NSString>(stylesheet.get()),
-                               base ? base->absoluteString()->utf8() : "", {}, *loader, ignored);
+                               base ? base->absoluteString()->utf8() : "", {}, *loader, ignored,
+                               tellingClient(context));
 }
 
 Value ext_xslt_uri(const Value* arguments, size_t count, XQueryContext& context) {
@@ -40,7 +52,7 @@ Value ext_xslt_uri(const Value* arguments, size_t count, XQueryContext& context)
   if (!URL) return Value();
   const Ref<NSURLLoader> loader = &context._internal().loader();
   std::string ignored;
-  return XMLResultOfStylesheetAtURL(*document, *URL, {}, *loader, ignored);
+  return XMLResultOfStylesheetAtURL(*document, *URL, {}, *loader, ignored, tellingClient(context));
 }
 
 }  // namespace xquery

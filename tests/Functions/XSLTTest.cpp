@@ -119,6 +119,42 @@ TEST(XSLT, KeepsToTheLoadingPolicy) {
             "error 17 invalid arguments to function - ext:xslt-uri");
 }
 
+class Hearer : public XQueryClient {
+ public:
+  void XQueryClientMissesDocument(const XQueryMissingDocument& missing, XQueryContext&) override {
+    heard.push_back(missing.URL + " - " + missing.reason);
+    if (throws) throw std::length_error("mine");
+  }
+  std::vector<std::string> heard;
+  bool throws = false;
+};
+
+TEST(XSLT, TellsTheClientWhatAStylesheetCannotLoad) {
+  const TestFolder folder;
+  const std::string none = folder.URL("none.xml"), broken = folder.write("broken.xml", "<a>\n<b>"),
+                    gone = folder.URL("gone.xsl");
+  Settings settings;
+  const auto client = std::make_shared<Hearer>();
+  settings.context->contextSetClient(client);
+  // Both are empty to the stylesheet, and each is told of once.
+  EXPECT_EQ(settings.answer("string(ext:xslt(/, $s))",
+                            root("<r><xsl:value-of select=\"count(document('" + none +
+                                 "')) + count(document('" + broken + "')) + count(document('" +
+                                 none + "')/a)\"/></r>")),
+            "(string 0)");
+  ASSERT_EQ(client->heard.size(), 2u);
+  EXPECT_EQ(client->heard[0], none + " - No such file or directory");
+  EXPECT_EQ(client->heard[1].find(broken + " - line 2, column "), 0u) << client->heard[1];
+  client->heard.clear();
+  EXPECT_EQ(settings.answer("ext:xslt-uri(/, '" + gone + "')", ""),
+            "error 17 invalid arguments to function - ext:xslt-uri");
+  EXPECT_EQ(settings.answer("ext:xslt(/, $s)", stylesheet("<xsl:include href='" + gone + "'/>")),
+            "error 17 invalid arguments to function - ext:xslt");
+  EXPECT_EQ(client->heard, std::vector<std::string>(2, gone + " - No such file or directory"));
+  client->throws = true;
+  EXPECT_THROW(settings.answer("ext:xslt-uri(/, '" + gone + "')", ""), std::length_error);
+}
+
 TEST(XSLT, EndsAtTheLimitsOfTheEvaluation) {
   const std::string endless = doubling(60, "<x/>");
   for (const std::string_view query :
