@@ -1,5 +1,7 @@
 #include "Platform/Reading/InputFile.h"
 
+#include "Platform/Base/WorkMeter.h"
+
 #include <cerrno>
 #include <fcntl.h>
 #include <poll.h>
@@ -8,8 +10,22 @@
 
 namespace xquery {
 
+namespace {
+
+// Waits for a writer where the file is a pipe. Whoever is interrupted in waiting may be told to
+// end.
+int openedFile(const std::string& path) {
+  int descriptor = -1;
+  while ((descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC)) < 0 && errno == EINTR) {
+    lookAtWork();
+  }
+  return descriptor;
+}
+
+}  // namespace
+
 InputFile::InputFile(const std::string& path)
-    : _descriptor(path == "-" ? STDIN_FILENO : ::open(path.c_str(), O_RDONLY | O_CLOEXEC)) {
+    : _descriptor(path == "-" ? STDIN_FILENO : openedFile(path)) {
   if (!isOpen()) _failure = errno;
 }
 
@@ -22,9 +38,7 @@ ptrdiff_t InputFile::read(char* buffer, size_t size, const NSXMLReadingProgress&
   pollfd input = {_descriptor, POLLIN, 0};
   if (beforeWaiting && ::poll(&input, 1, 0) == 0) beforeWaiting();
   ptrdiff_t count = 0;
-  do {
-    count = ::read(_descriptor, buffer, size);
-  } while (count < 0 && errno == EINTR);
+  while ((count = ::read(_descriptor, buffer, size)) < 0 && errno == EINTR) lookAtWork();
   if (count < 0) _failure = errno;
   if (count > 0) _bytesRead += static_cast<uint64_t>(count);
   if (count > 0 && progress) progress(_bytesRead, bytesInFile());
