@@ -308,6 +308,10 @@ TEST(ErrorPlaces, OfWhatIsCountedOrComparedAreNotInTheQuestion) {
   expectPlace("«1 + 2 - <a>x</a>» + 3", {});
   expectPlace("«<a>x</a> * 2» = 3 or 4", {});
   expectPlace("for $i in «1 to '3'» return $i", {});
+  expectPlace("count(for $i in «1 to 100000000000» return $i)", {});
+  expectPlace("some $i in 1, $j in «1 to 100000000000» satisfies $j = 'a'", {});
+  expectPlace("for $i in (1, 'a') order by «$i descending» return $i", {});
+  expectPlace("«for $i in (1, 'a') order by 1, $i return $i»", {});
   expectPlace("declare function local:f($n) { «$n//a» }; count(local:f(1))",
               {"local:f: local:f(1)"});
 }

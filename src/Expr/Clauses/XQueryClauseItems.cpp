@@ -16,7 +16,7 @@ XQueryClauseItems::XQueryClauseItems(const XQueryExpr* expr, XQueryContext& cont
       _haveFailed = XQueryHasFailed(bounds.answer, context);
       return;
     }
-    _count = XQueryRangeCount(bounds, context);
+    _count = XQueryRangeCount(bounds, context, range->exprPlace());
     _first = bounds.first;
     _isRange = true;
     return;

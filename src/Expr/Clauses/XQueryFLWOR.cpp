@@ -346,7 +346,9 @@ Value XQueryFLWORExpr::firstItems(uint64_t most, XQueryContext& context) const {
 
   const XQueryOrderSpec& first = *_orderSpecs.front();
   if (!XQueryFLWORSortFirst(results.sortList, first.ascending(), first.emptyLeast(), most)) {
-    return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()), exprPlace());
+    // Of several keys it is not known which.
+    const XQueryPlaceNumber at = _orderSpecs.size() == 1 ? first.exprPlace() : exprPlace();
+    return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()), at);
   }
   auto sorted = XQuerySequence::sequence();
   sorted->objects().reserve(results.sortList.items.size());

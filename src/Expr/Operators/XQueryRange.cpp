@@ -39,8 +39,10 @@ uint64_t mostRangeItems() {
   return most;
 }
 
-[[noreturn]] void raiseRangeTooLong(XQueryContext& context) {
-  context._internal().raise(XQueryErrors::rangeTooLong.error());
+[[noreturn]] void raiseRangeTooLong(XQueryContext& context, XQueryPlaceNumber at = 0) {
+  XQueryContextInternal& dynamic = context._internal();
+  if (at != 0) dynamic.raise(XQueryErrors::rangeTooLong.error(), at);
+  dynamic.raise(XQueryErrors::rangeTooLong.error());
 }
 
 // --- comparing with a range ----------------------------------------------------------------------
@@ -109,10 +111,11 @@ XQueryRangeBounds XQueryRangeBoundsFrom(const Value& left, const Value& right,
   return bounds;
 }
 
-uint64_t XQueryRangeCount(const XQueryRangeBounds& bounds, XQueryContext& context) {
+uint64_t XQueryRangeCount(const XQueryRangeBounds& bounds, XQueryContext& context,
+                          XQueryPlaceNumber at) {
   const uint64_t distance =
       static_cast<uint64_t>(bounds.last) - static_cast<uint64_t>(bounds.first);
-  if (distance >= mostRangeItems()) raiseRangeTooLong(context);
+  if (distance >= mostRangeItems()) raiseRangeTooLong(context, at);
   return distance + 1;
 }
 

@@ -1,6 +1,7 @@
 // The range operator.
 #pragma once
 
+#include "Platform/Base/XQueryPlaces.h"
 #include "xquery/Object.h"
 
 #include <cstdint>
@@ -20,8 +21,10 @@ struct XQueryRangeBounds {
 
 XQueryRangeBounds XQueryRangeBoundsFrom(const Value& left, const Value& right,
                                         XQueryContext& context);
-// How many integers bounds that have them enclose. Raises error 0 when they are too many.
-uint64_t XQueryRangeCount(const XQueryRangeBounds& bounds, XQueryContext& context);
+// How many integers bounds that have them enclose. Raises error 0 when they are too many: at the
+// place, or where the expression stands that lets the error out.
+uint64_t XQueryRangeCount(const XQueryRangeBounds& bounds, XQueryContext& context,
+                          XQueryPlaceNumber at = 0);
 // The integers from bounds that have them. Raises error 0 when they are too many.
 Value XQueryRangeIntegers(const XQueryRangeBounds& bounds, XQueryContext& context);
 
