@@ -1,0 +1,161 @@
+// Paths, conditions and what is compared.
+#include "Plan/ProgramGenerator.h"
+
+namespace xquery::plantest {
+
+std::string ProgramGenerator::nodeTest() {
+  return _random.oneOf({"a", "b", "c", "*", "a", "b", "text()", "node()", "*:a"});
+}
+
+std::string ProgramGenerator::predicate(int depth) {
+  switch (_random.below(11)) {
+    case 10:
+      return "[" + computedPosition(depth) + "]";
+    case 0:
+      return "[" +
+             _random.oneOf({"1", "2", "last()", "last() - 1", "position() = last()",
+                            "position() < 3", "position() = 1"}) +
+             "]";
+    case 1:
+      return "[" +
+             _random.oneOf({"@x", "b", "c/a", "not(@y)", "b and @x", "not(a or @y = 1)",
+                            "ancestor::b", "not(. = 'u') and c", "exists(b[. = 2])",
+                            "not(preceding-sibling::a)", "following-sibling::b or @x",
+                            "preceding-sibling::b = 'u'", "empty(following-sibling::node())"}) +
+             "]";
+    case 2:
+      return "[" + nameCondition() + "]";
+    case 3:
+      return "[" + existence(depth - 1) + "]";
+    case 4:
+      return "[" + membership(depth - 1) + "]";
+    default:
+      return "[" + comparison(depth - 1) + "]";
+  }
+}
+
+std::string ProgramGenerator::computedPosition(int depth) {
+  const std::string number =
+      _random.oneOf({"count(" + path(depth - 1) + ")", "number(" + variable() + ")", variable(),
+                     "xs:integer('u')", "position()", "sum((1, 0.5))"});
+  return number + _random.oneOf({" + 1", " - 1", " * 1.5", " + last()", " idiv 0", " mod 3"});
+}
+
+std::string ProgramGenerator::nameCondition() {
+  const std::string condition = _random.oneOf({"name()", "local-name(.)", "name(.)"}) +
+                                _random.oneOf({" = ", " = ", " eq ", " != "}) +
+                                _random.oneOf({"'a'", "'b'", "'x'", "'p:a'", "('a', 'c')"});
+  switch (_random.below(4)) {
+    case 0:
+      return _random.oneOf({"self::a", "self::a or self::b", "self::x or self::y",
+                            ". instance of element(a)", "string(node-name(.)) = 'b'",
+                            "local-name() = 'a' and string(namespace-uri(.)) = 'urn:p'"});
+    case 1:
+      return _random.oneOf({"self::b or ", "self::c or self::x or "}) + condition;
+    default:
+      return condition;
+  }
+}
+
+std::string ProgramGenerator::membership(int depth) {
+  const std::string set = _variables.empty() ? "(" + path(depth) + ")" : variable();
+  const std::string node = _random.oneOf({".", ".", "./b", variable()});
+  switch (_random.below(5)) {
+    case 4:
+      return nearbyNode();
+    case 0:
+      return "exists(" + node + _random.oneOf({" intersect ", " except "}) + set + ")";
+    case 1:
+      return "count(" + node + " | " + set + ") = count(" + set + ")";
+    case 2:
+      return "count(" + set + " | " + node + ") > 3";
+    default:
+      return "(some $w in " + set + " satisfies " +
+             (_random.below(2) ? "$w is " + node : node + " is $w") + ")";
+  }
+}
+
+std::string ProgramGenerator::nearbyNode() {
+  const std::string found =
+      _random.oneOf({"ancestor::a", "ancestor-or-self::b", "ancestor::node()", "../b", "a", "@x",
+                     "b/text()", variable() + "/c", variable() + "/ancestor::a",
+                     "preceding-sibling::a", "following-sibling::*/c"});
+  const std::string both =
+      _random.below(2) ? found + " intersect " + variable() : variable() + " intersect " + found;
+  return _random.oneOf({"", "not", "exists", "c and ", "not(@x) or "}) + "(" + both + ")";
+}
+
+std::string ProgramGenerator::existence(int depth) {
+  const std::string nodes = _random.below(3) ? "." + step(depth) : path(depth);
+  switch (_random.below(4)) {
+    case 0:
+      return nodes;
+    case 1:
+      return "count(" + nodes + ")" +
+             _random.oneOf({" > 0", " = 0", " >= 2", " lt 2", " ne 0", " <= 1", ""});
+    case 2:
+      return _random.oneOf({"1 < ", "0 eq ", "2 >= "}) + "count((" + nodes + "))";
+    default:
+      return _random.oneOf({"exists(", "empty(", "not(", "boolean("}) + nodes + ")";
+  }
+}
+
+std::string ProgramGenerator::step(int depth) {
+  std::string text = _random.oneOf({"/", "/", "//"});
+  if (_random.below(8) == 0) {
+    text += _random.oneOf({"(a | b)", "(a | b | c)", "(@x | @y)", "(a | a)", "(a | @x)"});
+    return depth > 0 && _random.below(3) == 0 ? text + predicate(depth) : text;
+  }
+  text += _random.oneOf({"", "", "", "", "@", "..",
+                         "self::", "following-sibling::", "preceding-sibling::", "ancestor::",
+                         "ancestor-or-self::", "descendant::", "following::"});
+  if (text.ends_with("..")) return text;
+  text += text.ends_with("@") ? _random.oneOf({"x", "y", "*"}) : nodeTest();
+  if (depth > 0 && _random.below(3) == 0) text += predicate(depth);
+  return text;
+}
+
+std::string ProgramGenerator::path(int depth) {
+  std::string text = _random.oneOf({"", "", variable(), variable(), "."});
+  if (text == "." && _random.below(2)) text = "(" + expr(depth - 1) + ")";
+  const size_t steps = 1 + _random.below(3);
+  for (size_t i = 0; i < steps; ++i) text += step(depth);
+  if (_random.below(8) == 0) {
+    text += _random.oneOf({"/position()", "/last()", "/string(position())", "/data(.)", "/(., 1)",
+                           "/concat(position(), last())"});
+  }
+  if (_random.below(8) == 0) text += "/(" + expr(depth - 1) + ")";
+  return text;
+}
+
+std::string ProgramGenerator::comparison(int depth) {
+  static const std::vector<std::string> operators = {" = ",  " = ",  " != ", " < ", " > ",
+                                                     " >= ", " eq ", " lt ", " ne "};
+  return operand(depth) + _random.oneOf(operators) + operand(depth);
+}
+
+std::string ProgramGenerator::operand(int depth) {
+  switch (_random.below(10)) {
+    case 0:
+      return literal();
+    case 9:
+      return constant();
+    case 1:
+      return "number(" + expr(depth - 1) + ")";
+    case 2:
+      return _random.oneOf(
+                 {"exactly-one(", "zero-or-one(", "string(", "data(", "max(", "count(", "sum("}) +
+             path(depth - 1) + ")";
+    case 3:
+      return "@" + _random.oneOf({"x", "y"});
+    case 4:
+      return variable();
+    case 5:
+      return _random.oneOf({"xs:integer(", "xs:integer(", "xs:token(", "xs:NCName("}) +
+             _random.oneOf({"'1'", "'u'", "2"}) + ")";
+    default:
+      return path(depth - 1);
+  }
+}
+
+}  // namespace xquery::plantest
