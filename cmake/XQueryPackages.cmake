@@ -78,4 +78,18 @@ if(TARGET xquery-command)
 and the documents about the language.")
 endif()
 
+if(TARGET xquery_python)
+  set(CPACK_DEBIAN_PYTHON_PACKAGE_SHLIBDEPS ON)
+  set(CPACK_DEBIAN_PYTHON_PACKAGE_CONTROL_EXTRA "${PROJECT_SOURCE_DIR}/cmake/packages/prerm")
+  # The command cuts documents for a cluster.
+  set(CPACK_DEBIAN_PYTHON_PACKAGE_SUGGESTS "python3-distributed, python3-lxml, xquery")
+  math(EXPR next_minor "${Python_VERSION_MINOR} + 1")
+  string(CONCAT python_depends "libxquery${PROJECT_VERSION_MAJOR} ${this_version}, "
+    "python3 (>= ${Python_VERSION_MAJOR}.${Python_VERSION_MINOR}), "
+    "python3 (<< ${Python_VERSION_MAJOR}.${next_minor}~)")
+  package(python python3-xquery python "${python_depends}" "engine for XQuery - Python module"
+    "This package holds the module for Python, with the part that evaluates a query
+over many documents on many machines.")
+endif()
+
 include(CPack)

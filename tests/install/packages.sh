@@ -94,7 +94,7 @@ if [[ " ${names[*]} " == *" python3-xquery "* ]]; then
   module=$(PYTHONPATH=$usr/lib/python3/dist-packages /usr/bin/python3 -c '
 import sys, xquery
 print(xquery.__file__)
-print(*(str(title) for title in xquery.query("//book[price > 10]/title", sys.argv[1])), sep="\n")
+print(*(title.text for title in xquery.query("//book[price > 10]/title", sys.argv[1])), sep="\n")
 ' "$books")
   same "the Python module" "$usr/lib/python3/dist-packages/xquery/__init__.py"$'\n'"$titles" "$module"
 fi
