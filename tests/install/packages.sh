@@ -82,13 +82,11 @@ same "the C++ example" "$titles" "$("$work/build/embed" "$books")"
 
 PKG_CONFIG_PATH=$(dirname "$(find "$usr" -name xquery.pc)")
 export PKG_CONFIG_PATH
-example=$usr/share/doc/libxquery-dev/examples/embedding.c
-if [ -f "$example" ]; then
-  # The flags are a list of words.
-  # shellcheck disable=SC2046
-  gcc -std=c99 "$example" -o "$work/embedding" $(pkg-config --cflags --libs xquery)
-  same "the C example" "$titles" "$("$work/embedding" "$books")"
-fi
+# The flags are a list of words.
+# shellcheck disable=SC2046
+gcc -std=c99 "$usr/share/doc/libxquery-dev/examples/embed.c" -o "$work/embed" \
+  $(pkg-config --cflags --libs xquery)
+same "the C example" "$titles" "$("$work/embed" "$books")"
 
 if [[ " ${names[*]} " == *" python3-xquery "* ]]; then
   module=$(PYTHONPATH=$usr/lib/python3/dist-packages /usr/bin/python3 -c '
