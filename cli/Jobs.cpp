@@ -12,6 +12,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <condition_variable>
 #include <deque>
 #include <mutex>
 #include <thread>
@@ -44,12 +45,15 @@ class Jobs {
   Status run();
 
  private:
+  // Counts one that is under way, until what it measured is in the profile.
+  class Evaluating;
+
   Status status();
   // Takes one part after the other until there are no more; on each thread.
   void work();
   void makePart(size_t number, Phases& phases);
-  Ref<NSArray> resultOf(const Input* input, Phases& phases) const;
-  Ref<NSArray> evaluated(const Value& contextItem, Phases& phases) const;
+  Ref<NSArray> resultOf(const Input* input, Phases& phases);
+  Ref<NSArray> evaluated(const Value& contextItem, Phases& phases);
   void endIfInterrupted();
   // What is said about one of several inputs names it, and what is said to a program always.
   std::string reported(const Input* input, const Failure& failure) const;
@@ -64,14 +68,19 @@ class Jobs {
   std::atomic<bool> _isAnyTrue = false;
   std::atomic<size_t> _next = 0;
   std::mutex _mutex;
+  size_t _evaluations = 0;  // under way; under the mutex
+  std::condition_variable _endOfEvaluation;
   Phases& _phases;
   const std::shared_ptr<MissingDocuments> _missing = std::make_shared<MissingDocuments>(_options);
   Profile* const _profile;  // null where none is asked for
 };
 
+// An interrupt ends the evaluations of all threads, each within a fraction of a second: what they
+// have measured belongs to the profile. Others may read for as long as they like.
 void Jobs::endIfInterrupted() {
   if (_profile && interruption()->load()) {
-    const std::lock_guard lock(_mutex);
+    std::unique_lock lock(_mutex);
+    _endOfEvaluation.wait(lock, [&] { return _evaluations == 0; });
     _profile->writeAnyway(_phases);
   }
   cli::endIfInterrupted();
@@ -130,7 +139,7 @@ void Jobs::makePart(size_t number, Phases& phases) {
   }
 }
 
-Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) const {
+Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) {
   if (input && !input->failure.empty()) {
     throw Failure{StatusInput, "xquery: " + shownName(input->path) + ": " + input->failure, {}};
   }
@@ -144,7 +153,25 @@ Ref<NSArray> Jobs::resultOf(const Input* input, Phases& phases) const {
   return items;
 }
 
-Ref<NSArray> Jobs::evaluated(const Value& contextItem, Phases& phases) const {
+class Jobs::Evaluating {
+ public:
+  explicit Evaluating(Jobs& jobs) : _jobs(jobs) {
+    const std::lock_guard lock(_jobs._mutex);
+    ++_jobs._evaluations;
+  }
+  ~Evaluating() {
+    const std::lock_guard lock(_jobs._mutex);
+    if (--_jobs._evaluations == 0) _jobs._endOfEvaluation.notify_all();
+  }
+  Evaluating(const Evaluating&) = delete;
+  Evaluating& operator=(const Evaluating&) = delete;
+
+ private:
+  Jobs& _jobs;
+};
+
+Ref<NSArray> Jobs::evaluated(const Value& contextItem, Phases& phases) {
+  const Evaluating evaluating(*this);
   Evaluation evaluation(_options, _missing);
   Ref<NSArray> items;
   try {

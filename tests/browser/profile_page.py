@@ -166,9 +166,49 @@ class ProfilePage(unittest.TestCase):
 
     def test_clicking_a_line_selects_its_expressions(self):
         self.open("plain", QUERY)
-        self.browser.click("#query tr[data-line='2'] td.text")
+        self.browser.click("#query tr[data-line='2'] td.number")
         self.assertGreater(self.count("#plan tr.selected"), 3)
         self.assertTrue(self.frames("frame.classList.contains('selected')"))
+
+    def selected_text(self):
+        return self.run_script("[...document.querySelectorAll('#query span.selected')]"
+                               ".map((piece) => piece.textContent).join('')")
+
+    def test_the_text_is_as_hot_as_its_innermost_expression(self):
+        self.open("plain", QUERY)
+        self.assertEqual(self.run_script("[...document.querySelectorAll('#query td.text')]"
+                                         ".map((cell) => cell.textContent).join('\\n')"),
+                         QUERY.rstrip())
+        titles = self.run_script("[...document.querySelectorAll('.piece')].map((p) =>"
+                                 " [p.textContent.trim(), p.title.replace(/: own .*/, '')])")
+        owners = {text: title.split(": ")[-1] for text, title in titles}
+        for text, owner in (("local:fib(", "local:fib(...)"), ("$n - 1", "-"), ("mod 7", "mod"),
+                            ("order by", "FLWOR"), ("local:slow($k)", "local:slow(...)")):
+            self.assertEqual(owners[text], owner)
+        hottest = self.run_script("[...document.querySelectorAll('.piece')].sort((a, b) =>"
+                                  " parseFloat(b.style.getPropertyValue('--heat')) -"
+                                  " parseFloat(a.style.getPropertyValue('--heat')))[0].textContent")
+        self.assertTrue(any(part in hottest for part in ("sum(", "for $i", "if (", "local:fib",
+                                                         "$i * $k")), hottest)
+
+    def test_clicking_a_piece_of_the_text_selects_its_expression(self):
+        self.open("plain", QUERY)
+        name = self.run_script("""(() => {
+          const piece = [...document.querySelectorAll('#query tr[data-line="5"] .piece')][0];
+          piece.id = 'wanted';
+          return piece.title; })()""")
+        self.browser.click("#wanted")
+        self.assertEqual(self.count("#plan tr.selected"), 1)
+        self.assertIn("sum(...): own", name)
+        self.assertTrue(self.run_script(
+            "document.querySelector('#plan tr.selected .label').textContent").endswith("sum(...)"))
+        self.assertTrue(self.selected_text().startswith("sum(for $i in 1 to 4000"))
+
+    def test_places_count_characters(self):
+        self.open("wide", "\ufeffcount(('\U0001f600', 'e\u0301'))\r\n+ count((\t'b', (1 to 3)))")
+        self.run_script("[...document.querySelectorAll('#plan .label')].filter((label) =>"
+                        " label.textContent.includes('count('))[1].click()")
+        self.assertEqual(self.selected_text(), "count((\t'b', (1 to 3)))")
 
     def test_expressions_can_be_sorted(self):
         self.open("plain", QUERY)
@@ -270,19 +310,23 @@ class ProfilePage(unittest.TestCase):
             worst = self.run_script("""(() => {
               const canvas = document.createElement('canvas')
                 .getContext('2d', { willReadFrequently: true });
-              const rgb = (color) => { canvas.fillStyle = color; canvas.fillRect(0, 0, 1, 1);
+              const rgb = (colors) => {
+                for (const color of colors) {
+                  canvas.fillStyle = color;
+                  canvas.fillRect(0, 0, 1, 1);
+                }
                 return [...canvas.getImageData(0, 0, 1, 1).data].slice(0, 3); };
-              const light = (color) => rgb(color).map((v) => (v /= 255) <= 0.03928 ? v / 12.92
+              const light = (colors) => rgb(colors).map((v) => (v /= 255) <= 0.03928 ? v / 12.92
                 : ((v + 0.055) / 1.055) ** 2.4)
                 .reduce((sum, v, i) => sum + v * [0.2126, 0.7152, 0.0722][i], 0);
-              const ground = (e) => { for (; e; e = e.parentElement) {
-                const color = getComputedStyle(e).backgroundColor;
-                if (color !== 'rgba(0, 0, 0, 0)') return color; } return 'white'; };
+              // From the page up to the element: some are drawn through.
+              const ground = (e) => (e ? [...ground(e.parentElement),
+                getComputedStyle(e).backgroundColor] : ['white']);
               let worst = [99, ''];
               for (const e of document.querySelectorAll(
-                  '.frame:not(.above), td, th, p, dt, dd, h1, h2, .note, .role, button')) {
+                  '.frame:not(.above), td, th, p, dt, dd, h1, h2, .note, .role, button, .piece')) {
                 if (!e.textContent.trim()) continue;
-                const [a, b] = [light(getComputedStyle(e).color), light(ground(e))];
+                const [a, b] = [light([getComputedStyle(e).color]), light(ground(e))];
                 const contrast = (Math.max(a, b) + 0.05) / (Math.min(a, b) + 0.05);
                 const name = e.className + ' ' + e.textContent.slice(0, 30);
                 if (contrast < worst[0]) worst = [contrast, name];

@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <csignal>
 #include <filesystem>
+#include <fstream>
 #include <regex>
 #include <set>
 #include <sstream>
@@ -171,6 +172,20 @@ TEST_F(ProfileCommand, IsWrittenAtAnInterrupt) {
   EXPECT_EQ(jsonMember(content("p.json"), "evaluations"), "1");
   EXPECT_EQ(jsonMember(content("p.json"), "failures"), "1");
   EXPECT_EQ(files(), 1u);
+}
+
+TEST_F(ProfileCommand, AtAnInterruptHasWhatAllThreadsMeasured) {
+  for (const char* name : {"a.xml", "b.xml", "c.xml"}) std::ofstream(path(name)) << "<a/>";
+  const Outcome outcome = command::start(
+      "/bin/bash",
+      {"-mc",
+       "env --default-signal=INT \"$0\" --jobs 3 --profile \"$1/p.json\" -e \"$2\" \"$1\"/?.xml & "
+       "pid=$!; sleep 1.5; kill -INT $pid; wait $pid",
+       XQUERY_BINARY_DIR "/xquery", path(""), endless});
+  EXPECT_EQ(outcome.status, 130) << outcome.err;
+  EXPECT_EQ(jsonMember(content("p.json"), "evaluations"), "3");
+  EXPECT_EQ(jsonMember(content("p.json"), "inputs"), "3");
+  EXPECT_EQ(jsonMember(content("p.json"), "failures"), "3");
 }
 
 TEST_F(ProfileCommand, ThatCannotBeWrittenIsSaidBeforeAnythingIsEvaluated) {

@@ -59,6 +59,10 @@ std::string ofExpression(const XQueryProfiledExpression& expression,
   if (expression.place.line > 0) {
     json += numberMember("line", static_cast<uint64_t>(expression.place.line));
   }
+  if (expression.place.column > 0) {
+    json += numberMember("column", static_cast<uint64_t>(expression.place.column));
+    json += numberMember("length", static_cast<uint64_t>(expression.place.length));
+  }
   json += ",\"notes\":[";
   for (size_t i = 0; i < expression.notes.size(); ++i) {
     const XQueryPlanReport::Note& note = expression.notes[i];

@@ -4,9 +4,13 @@
 #include "Plan/Planning.h"
 #include "Plan/Profile/XQueryProfiledExpr.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Base/XQueryPlaces.h"
+#include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "xquery/URL.h"
 
+#include <algorithm>
+#include <tuple>
 #include <utility>
 
 namespace xquery {
@@ -50,6 +54,7 @@ class Profiling {
         add(entry);
       }
     }
+    findColumns();
   }
 
  private:
@@ -57,11 +62,36 @@ class Profiling {
     return _program[place].slot && !_planning.isOpen(place) && !_planning.isWrapped(place);
   }
 
-  // The one function that says where an expression is written.
+  // The module and the line of an expression; findColumns knows it better where it has a place.
   XQueryProfilePlace placeOf(XQueryPlaceID place, int64_t line) const {
     const XQueryProlog* prolog = _program.bodyOf(place).prolog;
     const bool isImported = prolog && prolog != &_main && prolog->moduleURL();
     return {isImported ? prolog->moduleURL()->absoluteString()->utf8() : std::string(), line};
+  }
+
+  // In the order of the text, which is then read but once.
+  void findColumns() {
+    const XQueryPlaces& places = *_main.modules().places();
+    std::stable_sort(_written.begin(), _written.end(), [&](const Written& a, const Written& b) {
+      return std::tuple(a.module, places.span(a.number).start) <
+             std::tuple(b.module, places.span(b.number).start);
+    });
+    XQueryPlaceCursor cursor(places);
+    WorkPacer pacer;
+    for (const Written& each : _written) {
+      pacer.turn();
+      if (!cursor.goTo(each.number)) continue;
+      const XQuerySpan span = places.span(each.number);
+      XQueryProfilePlace& place = _profiled.expressions[each.index].place;
+      place.line = cursor.line();
+      place.column = cursor.column();
+      place.length = span.end - span.start;
+    }
+  }
+
+  // What the expression at the place is told as.
+  void write(XQueryPlaceID place, size_t index) {
+    _written.push_back({_program.bodyOf(place).prolog, _program[place].expr->exprPlace(), index});
   }
 
   void addBody(const XQueryPlanReport::Entry& entry) {
@@ -81,6 +111,7 @@ class Profiling {
       body.label = entry.label;
       body.place = placeOf(entry.place, entry.line);
       body.notes = entry.notes;
+      write(entry.place, _profiled.expressions.size() - 1);
       _levelsLess = 1;
       return;
     }
@@ -88,6 +119,7 @@ class Profiling {
     const size_t index = _profiled.expressions.size();
     _profiled.expressions.push_back({entry.depth - _levelsLess, std::string(entry.role),
                                      entry.label, placeOf(entry.place, entry.line), entry.notes});
+    write(entry.place, index);
     if (isCounted(entry.place)) count(entry.place, index);
   }
 
@@ -115,10 +147,17 @@ class Profiling {
     _program.replace(place, XQueryProfiledExpr::exprWithPlain(_planning.exprAt(place), counter));
   }
 
+  struct Written {
+    const XQueryProlog* module;
+    XQueryPlaceNumber number;
+    size_t index;  // of the expression
+  };
+
   XQueryPlanning& _planning;
   XQueryProgram& _program;
   const XQueryProlog& _main;
   XQueryProfiledProgram& _profiled;
+  std::vector<Written> _written;
   std::vector<bool> _isInside;
   XQueryPlaceID _inBody = XQueryNoPlace;  // what the body at hand consists of
   size_t _levelsLess = 0;                 // that the parts of the body stand below it

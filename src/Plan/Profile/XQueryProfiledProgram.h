@@ -28,6 +28,8 @@ class XQueryProlog;
 struct XQueryProfilePlace {
   std::string module;  // the URL of an imported one; empty for the query itself
   int64_t line = 0;    // from 1; 0 where it is not known
+  int64_t column = 0;  // of its first character, from 1; 0 where it is not known
+  int64_t length = 0;  // in characters, a line end being one; 0 where it is not known
 };
 
 struct XQueryProfiledExpression {

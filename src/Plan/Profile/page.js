@@ -234,37 +234,113 @@
   // --- the query ---------------------------------------------------------------------------------
 
   const lineRows = [];
+  const pieces = [];  // of the text, each within one line and of one expression
+  const isHere = (each) => !each.module && each.line > 0;
+
+  // Places count characters, and an end of a line as one, whatever it is made of.
+  const textLines = profile.text.replace(/^\ufeff/, "").replace(/\s+$/, "")
+    .split(/\r\n|\r|\n/).map((line) => [...line]);
+  const lineStarts = [];
+  const textLength = textLines.reduce((at, line) => {
+    lineStarts.push(at);
+    return at + line.length + 1;
+  }, 0);
+
+  // From the first character to behind the last one; null where it is not known.
+  function spanOf(each) {
+    if (!isHere(each) || !each.column || each.line > lineStarts.length) return null;
+    const start = lineStarts[each.line - 1] + each.column - 1;
+    return { start, end: Math.min(start + each.length, textLength) };
+  }
+  const spans = expressions.map(spanOf);
+
+  // Where pieces begin or end, and for each character the innermost expression that is counted.
+  function cutText() {
+    const borders = new Set(lineStarts);
+    const owners = new Int32Array(textLength).fill(-1);
+    const order = expressions.map((_, index) => index).filter((index) => spans[index]);
+    const lengthOf = (index) => spans[index].end - spans[index].start;
+    order.sort((a, b) => lengthOf(b) - lengthOf(a) || a - b);
+    for (const index of order) {
+      const { start, end } = spans[index];
+      borders.add(start).add(end);
+      if (expressions[index].calls > 0) owners.fill(index, start, end);
+    }
+    return { borders, owners };
+  }
+  function addPieces(cell, line, { borders, owners }, most) {
+    const first = lineStarts[line];
+    const characters = textLines[line];
+    for (let from = 0; from < characters.length;) {
+      let to = from + 1;
+      while (to < characters.length && !borders.has(first + to)) to += 1;
+      const owner = owners[first + from];
+      const text = characters.slice(from, to).join("").replace(/[^\t]+/g, visible);
+      const piece = element("span", owner < 0 ? "" : "piece", text);
+      piece.start = first + from;
+      if (owner >= 0) {
+        const { own } = expressions[owner];
+        piece.style.setProperty("--heat", (90 * own) / most + "%");
+        piece.title = nameOf(expressions[owner]) + ": own " + ms(own) + " ms (" + share(own) + ")";
+        piece.expression = owner;
+      }
+      pieces.push(piece);
+      cell.append(piece);
+      from = to;
+    }
+    if (!characters.length) cell.append(" ");
+  }
   function showQuery() {
     const costs = new Map();
+    let most = 1e-9;
     for (const each of expressions) {
-      if (!isCounted(each) || !each.line || each.module) continue;
+      if (!isCounted(each) || !isHere(each)) continue;
       const cost = costs.get(each.line) || { own: 0, calls: 0 };
       cost.own += each.own;
       cost.calls += each.calls;
       costs.set(each.line, cost);
+      most = Math.max(most, each.own);
     }
-    const most = Math.max(...[...costs.values()].map((cost) => cost.own), 1e-9);
+    const mostOfLine = Math.max(...[...costs.values()].map((cost) => cost.own), 1e-9);
+    const cuts = cutText();
     const rows = document.createDocumentFragment();
-    profile.text.replace(/\s+$/, "").split(/\r\n|\r|\n/).forEach((text, index) => {
+    textLines.forEach((_, index) => {
       const cost = costs.get(index + 1);
       const row = element("tr");
       row.append(element("td", "number", String(index + 1)));
       const heat = element("td", "heat", cost && cost.calls ? ms(cost.own) : "");
-      heat.style.setProperty("--heat", cost ? (90 * cost.own) / most + "%" : "0%");
+      heat.style.setProperty("--heat", cost ? (90 * cost.own) / mostOfLine + "%" : "0%");
       row.append(heat, element("td", "", cost && cost.calls ? share(cost.own) : ""));
-      row.append(element("td", "text", text.replace(/[^\t]+/g, visible) || " "));
+      const text = element("td", "text");
+      addPieces(text, index, cuts, most);
+      row.append(text);
       row.dataset.line = index + 1;
       lineRows.push(row);
       rows.append(row);
     });
     byId("query").tBodies[0].replaceChildren(rows);
   }
+  // A click on a piece of the text means its expression, one beside it all of the line.
   byId("query").addEventListener("click", (event) => {
     const row = event.target.closest("tr[data-line]");
     if (!row) return;
+    const { expression } = event.target;
+    if (expression !== undefined) return select([expression], true);
     const line = Number(row.dataset.line);
     select(expressions.flatMap((each, i) => (each.line === line && !each.module ? [i] : [])), true);
   });
+  // The text of the expressions, or where that is not known their lines.
+  function selectText(indexes) {
+    const isChosen = new Uint8Array(textLength);
+    for (const index of indexes) {
+      if (spans[index]) isChosen.fill(1, spans[index].start, spans[index].end);
+    }
+    for (const piece of pieces) piece.classList.toggle("selected", isChosen[piece.start] === 1);
+    const lines = new Set(indexes.filter((index) => isHere(expressions[index]))
+      .map((index) => expressions[index].line));
+    lineRows.forEach((row, index) => row.classList.toggle("selected", lines.has(index + 1)));
+    return Math.min(...lines);
+  }
 
   // --- the expressions ---------------------------------------------------------------------------
 
@@ -328,15 +404,12 @@
   function select(indexes, toPlan) {
     selected = new Set(indexes);
     planRows.forEach((row, index) => row.classList.toggle("selected", selected.has(index)));
-    const ofQuery = indexes.filter((index) => !expressions[index].module);
-    const lines = new Set(ofQuery.map((index) => expressions[index].line));
-    lineRows.forEach((row, index) => row.classList.toggle("selected", lines.has(index + 1)));
+    const line = selectText(indexes);
     for (const frame of flame.querySelectorAll(".frame")) {
       frame.classList.toggle("selected", selected.has(frame.node.expression));
     }
     if (!indexes.length) return;
     scrollWithin(byId("plan-scroller"), planRows[indexes[0]]);
-    const line = Math.min(...lines);
     if (!toPlan && lineRows[line - 1]) scrollWithin(byId("query-scroller"), lineRows[line - 1]);
   }
   // Of the table alone: the page stays where it is.

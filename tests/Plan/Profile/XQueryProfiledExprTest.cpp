@@ -106,6 +106,22 @@ TEST(ProfiledExpressions, OfFunctionsAndVariablesOfOtherModulesHaveTheirModule) 
   }
 }
 
+// In characters, whatever those before them are made of.
+TEST(ProfiledExpressions, KnowWhichTextTheyStandFor) {
+  const auto query = XQuery::xqueryWithSource(
+      "\xEF\xBB\xBF"
+      "for $x in ('😀é', 'b')\r\nwhere $x ne\n  'c'\nreturn upper-case($x)",
+      XQueryLoading(), XQueryLimits(), XQueryWay::Profiled);
+  ASSERT_FALSE(query->parseErrors());
+  std::vector<std::string> places;
+  for (const auto& each : query->_internal().profiledProgram()->expressions) {
+    places.push_back(each.label + " " + std::to_string(each.place.line) + ":" +
+                     std::to_string(each.place.column) + "+" + std::to_string(each.place.length));
+  }
+  EXPECT_THAT(places, ElementsAre("FLWOR 1:1+62", "for $x in 1:1+22", "(...) 1:11+12", "ne 2:7+11",
+                                  "upper-case(...) 4:8+14"));
+}
+
 TEST(ProfiledExpressions, ThatFailAreCounted) {
   const AsWritten asWritten;
   const Profiled profiled("for $i in (1, 0, 2) return 6 idiv $i");
