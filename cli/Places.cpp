@@ -2,6 +2,7 @@
 
 #include "JSON.h"
 #include "Messages.h"
+#include "Width.h"
 
 #include <algorithm>
 #include <cstdlib>
@@ -17,6 +18,7 @@ using namespace xquery;
 
 constexpr size_t mostCallsAtEachEnd = 5;
 constexpr size_t usualWidth = 80, leastWidth = 20;
+constexpr size_t leastText = 12;  // of a line that is cut
 
 // Of the terminal that hears it, where one does.
 size_t terminalWidth() {
@@ -33,8 +35,7 @@ std::string moduleName(const XQuerySourcePlace& place, const Options& options) {
 }
 
 int64_t lineOf(const XQuerySourcePlace& place, const Options& options) {
-  const auto before = static_cast<int64_t>(options.linesBefore);
-  return place.moduleURL || place.line <= before ? place.line : place.line - before;
+  return place.moduleURL ? place.line : lineAsEntered(place.line, options);
 }
 
 std::string shown(const XQuerySourcePlace& place, const Options& options) {
@@ -62,10 +63,11 @@ std::vector<std::string> shownCharacters(std::string_view line) {
 
 // How many columns a character takes that `visible` has shown.
 size_t widthOf(const std::string& character) {
-  return character.size() > 1 && character[0] == '\\' ? character.size() : 1;
+  const bool isEscape = character.size() > 1 && character[0] == '\\';
+  return isEscape ? character.size() : widthOfCharacter(character);
 }
 
-// The characters from `first` on that fit.
+// The characters from `first` on that fit. What is drawn over the last one belongs to it.
 size_t endOfWhatFits(const std::vector<std::string>& characters, size_t first, size_t width) {
   size_t used = 0, end = first;
   while (end < characters.size() && used + widthOf(characters[end]) <= width) {
@@ -118,15 +120,15 @@ std::string sourceLines(const XQuerySourcePlace& place, const Options& options,
   const std::string number = std::to_string(lineOf(place, options));
   const size_t gutter = number.size() + 5;
   const size_t width = terminalWidth();
-  const MarkedLine line =
-      markedLine(place, width > gutter + leastWidth ? width - gutter : leastWidth);
+  const MarkedLine line = markedLine(place, std::max(width - std::min(width, gutter), leastText));
   return "\n  " + number + " | " + line.text + "\n  " + std::string(number.size(), ' ') + " | " +
          line.blanks + marks.before + line.mark + marks.after;
 }
 
-std::string jsonOf(const XQuerySourcePlace& place) {
+std::string jsonOf(const XQuerySourcePlace& place, const Options& options) {
   return (place.moduleURL ? "\"module\":" + jsonString(place.moduleURL->utf8()) + "," : "") +
-         "\"line\":" + std::to_string(place.line) + ",\"column\":" + std::to_string(place.column) +
+         "\"line\":" + std::to_string(lineOf(place, options)) +
+         ",\"column\":" + std::to_string(place.column) +
          ",\"length\":" + std::to_string(place.length);
 }
 
@@ -159,6 +161,11 @@ std::string queryName(const Options& options) {
   return options.queryFile == "-" ? "standard input" : options.queryFile;
 }
 
+int64_t lineAsEntered(int64_t line, const Options& options) {
+  const auto before = static_cast<int64_t>(options.linesBefore);
+  return line > before ? line - before : line;
+}
+
 std::string linesOfPlace(const XQueryError& error, const Options& options, const Marks& marks) {
   const auto place = error.place();
   if (!place) return "";
@@ -178,14 +185,14 @@ std::string linesOfPlace(const XQueryError& error, const Options& options, const
   return text;
 }
 
-std::string jsonOfPlace(const XQueryError& error) {
+std::string jsonOfPlace(const XQueryError& error, const Options& options) {
   std::string json = ",\"category\":" + jsonString(nameOf(error.category()));
-  if (const auto place = error.place()) json += ",\"place\":{" + jsonOf(*place) + "}";
+  if (const auto place = error.place()) json += ",\"place\":{" + jsonOf(*place, options) + "}";
   std::string calls;
   for (const XQueryErrorCall& call : error.calls()) {
     calls += calls.empty() ? "{" : ",{";
     calls += "\"function\":" + jsonString(call.function ? call.function->utf8() : "");
-    if (call.place) calls += "," + jsonOf(*call.place);
+    if (call.place) calls += "," + jsonOf(*call.place, options);
     calls += "}";
   }
   if (!calls.empty()) json += ",\"calls\":[" + calls + "]";

@@ -16,6 +16,9 @@ namespace cli {
 // How messages name the query.
 std::string queryName(const Options& options);
 
+// Of a line of the query: without the lines that a session puts before what was entered.
+int64_t lineAsEntered(int64_t line, const Options& options);
+
 // Each line with a line feed before it, for a terminal; empty where nothing is known. `marks` is
 // what the terminal is told before the mark under a line, and what after it.
 struct Marks {
@@ -26,6 +29,6 @@ std::string linesOfPlace(const xquery::XQueryError& error, const Options& option
 
 // Members of an object: "category" and, where they are known, "place", "calls" and "callsLeftOut",
 // each with a comma before it.
-std::string jsonOfPlace(const xquery::XQueryError& error);
+std::string jsonOfPlace(const xquery::XQueryError& error, const Options& options);
 
 }  // namespace cli

@@ -45,15 +45,22 @@ std::string colored(const std::string& text) {
   return result;
 }
 
-std::string jsonOfError(const NSError& error) {
+// The line of a library module stands as it is.
+int64_t lineOf(const XQueryError& error, const Options& options) {
+  const auto place = error.place();
+  const bool isOfModule = error.moduleURL() || (place && place->moduleURL);
+  return isOfModule ? error.line() : lineAsEntered(error.line(), options);
+}
+
+std::string jsonOfError(const NSError& error, const Options& options) {
   const auto* own = dyn_cast<XQueryError>(&error);
   const Ref<NSString> text = own ? own->msg() : error.localizedDescription();
   std::string json = "\"code\":" + std::to_string(error.code());
   if (text) json += ",\"message\":" + jsonString(text->utf8());
-  if (own && own->line() > 0) json += ",\"line\":" + std::to_string(own->line());
+  if (own && own->line() > 0) json += ",\"line\":" + std::to_string(lineOf(*own, options));
   if (own && own->column() > 0) json += ",\"column\":" + std::to_string(own->column());
   if (own && own->moduleURL()) json += ",\"module\":" + jsonString(own->moduleURL()->utf8());
-  if (own) json += jsonOfPlace(*own);
+  if (own) json += jsonOfPlace(*own, options);
   return json;
 }
 
@@ -68,14 +75,19 @@ std::vector<Ref<NSError>> distinct(const std::vector<Ref<NSError>>& errors) {
 }
 
 // The description; where the place is told below it, without the line that names the module alone.
-std::string firstLines(const NSError& error) {
+std::string firstLines(const NSError& error, const Options& options) {
   std::string text = description(error);
   const auto* own = dyn_cast<XQueryError>(&error);
+  const std::string line = own ? " at line:" + std::to_string(own->line()) : "";
+  if (own && own->line() > 0 && text.ends_with(line)) {
+    text.erase(text.size() - line.size());
+    text += " at line:" + std::to_string(lineOf(*own, options));
+  }
   if (own && own->moduleURL() && own->place()) text.erase(text.rfind("\n  at "));
   return text;
 }
 
-std::string asJSON(const Failure& failure, const std::string& input) {
+std::string asJSON(const Options& options, const Failure& failure, const std::string& input) {
   const std::string rest = (input.empty() ? "" : ",\"input\":" + jsonString(input)) +
                            ",\"status\":" + std::to_string(failure.status) + "}\n";
   if (failure.errors.empty()) {
@@ -83,14 +95,14 @@ std::string asJSON(const Failure& failure, const std::string& input) {
   }
   std::string lines;
   for (const Ref<NSError>& error : distinct(failure.errors))
-    lines += "{" + jsonOfError(*error) + rest;
+    lines += "{" + jsonOfError(*error, options) + rest;
   return lines;
 }
 
 }  // namespace
 
 std::string report(const Options& options, const Failure& failure, const std::string& input) {
-  if (options.format == Format::JSON) return asJSON(failure, input);
+  if (options.format == Format::JSON) return asJSON(options, failure, input);
   const bool isNamed = !input.empty() && failure.status == StatusQueryError;
   const bool hasColor = usesColor(options);
   const auto head = [&](const std::string& text) {
@@ -102,7 +114,7 @@ std::string report(const Options& options, const Failure& failure, const std::st
   const Marks marks = hasColor ? Marks{"\033[1;31m", "\033[0m"} : Marks{};
   std::string text;
   for (const Ref<NSError>& error : distinct(failure.errors)) {
-    text += head((text.empty() ? name : "") + firstLines(*error));
+    text += head((text.empty() ? name : "") + firstLines(*error, options));
     const auto* own = dyn_cast<XQueryError>(error);
     if (own) text += linesOfPlace(*own, options, marks);
     text += "\n";
@@ -147,6 +159,7 @@ std::string asJSON(const XQueryWarning& warning) {
                      ",\"message\":" + jsonString(warning.text->utf8());
   if (warning.line > 0) json += ",\"line\":" + std::to_string(warning.line);
   if (warning.column > 0) json += ",\"column\":" + std::to_string(warning.column);
+  if (warning.length > 0) json += ",\"length\":" + std::to_string(warning.length);
   if (warning.module) json += ",\"module\":" + jsonString(warning.module->utf8());
   return json + "}\n";
 }

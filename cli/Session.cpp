@@ -16,6 +16,7 @@
 #include "Signals.h"
 #include "Streams.h"
 #include "Timing.h"
+#include "xquery/LimitedWork.h"
 #include "xquery/xquery.h"
 
 #include <cstdlib>
@@ -50,10 +51,6 @@ std::string takeWord(std::string_view& text) {
 std::string pathOf(std::string_view text) {
   const char* const home = std::getenv("HOME");
   return (home && text.starts_with("~/") ? home + std::string(text.substr(1)) : std::string(text));
-}
-
-bool isName(std::string_view text) {
-  return variablesIn("$" + std::string(text)) == std::vector<std::string>{std::string(text)};
 }
 
 void say(const std::string& text) {
@@ -96,6 +93,7 @@ class Session {
   // --- commands
   void load(std::string_view argument);
   void bind(std::string_view argument);
+  Ref<NSXMLDocument> read(const std::string& path) const;
   void showPlan(std::string_view argument);
   void switchTime(std::string_view argument);
   void help(std::string_view argument);
@@ -139,7 +137,7 @@ Session::Session(const Options& options)
   }
   // What the options bind need not be declared again, where its name has no prefix of the user's.
   for (const auto& [name, value] : _constants) {
-    if (isName(name) && name.find(':') == name.npos) {
+    if (isVariableName(name) && name.find(':') == name.npos) {
       _declarations.add("declare variable $" + name + " external;");
     }
   }
@@ -275,7 +273,7 @@ bool Session::reporting(const Query& query, const Work& work) {
     } else {
       Options options = _options;
       options.linesBefore = query.declarations.lines();
-      writeMessage(withoutPrologLines(report(options, failure), options.linesBefore));
+      writeMessage(report(options, failure));
     }
   } catch (const std::exception& error) {
     refuse(visible(error.what()));
@@ -314,14 +312,13 @@ void Session::bind(std::string_view argument) {
   if (argument.empty()) return refuse("expected :doc NAME FILE");
   const bool isContextItem = name == ".";
   const std::string variable = name.starts_with('$') ? name.substr(1) : name;
-  if (!isContextItem && !isName(variable)) {
+  if (!isContextItem && !isVariableName(variable)) {
     return refuse("expected the name of a variable, not \"" + visibleName(name) + "\"");
   }
   const std::string path = pathOf(argument);
   reporting({}, [&] {
     if (path == "-") throw Failure{StatusInput, "xquery: standard input is the session's own", {}};
-    const Ref<NSXMLDocument> document =
-        readDocument(_options, path, _options.html ? Markup::HTML : Markup::XML);
+    const Ref<NSXMLDocument> document = read(path);
     if (isContextItem) {
       _contextItem = document;
       _inputName = inputName(path);
@@ -330,6 +327,18 @@ void Session::bind(std::string_view argument) {
       _declarations.add("declare variable $" + variable + " external;");
     }
   });
+}
+
+// An interrupt ends the reading, and not the session.
+Ref<NSXMLDocument> Session::read(const std::string& path) const {
+  XQueryLimits limits;
+  limits.cancelled = interruption();
+  Ref<NSXMLDocument> document;
+  const auto error = XQueryWithinLimits(limits, [&] {
+    document = readDocument(_options, path, _options.html ? Markup::HTML : Markup::XML);
+  });
+  if (error) throw Failure{StatusInput, description(*error), {error}};
+  return document;
 }
 
 void Session::showPlan(std::string_view argument) {
@@ -383,8 +392,10 @@ Completions Session::complete(const std::string& textBeforeCursor) const {
 }  // namespace
 
 Status runSession(const Options& options) {
+  // There is no session yet that an interrupt could leave alone while its INPUT is read.
+  Session session(options);
   surviveInterrupts();
-  return Session(options).run();
+  return session.run();
 }
 
 }  // namespace cli

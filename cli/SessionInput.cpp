@@ -290,6 +290,14 @@ DeclarationName declarationName(std::string_view declaration) {
   return {Kind::Setting, second};
 }
 
+bool isVariableName(std::string_view text) {
+  const size_t colon = std::min(text.find(':'), text.size());
+  if (colon < text.size() && !isVariableName(text.substr(colon + 1))) return false;
+  const std::string name(text.substr(0, colon));
+  const bool hasOneColon = text.find(':', colon + 1) == text.npos || colon == text.size();
+  return hasOneColon && variablesIn("$" + name) == std::vector<std::string>{name};
+}
+
 std::vector<std::string> variablesIn(std::string_view text) {
   std::vector<std::string> names;
   for (size_t at = text.find('$'); at != text.npos; at = text.find('$', at + 1)) {

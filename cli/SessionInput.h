@@ -33,6 +33,9 @@ struct DeclarationName {
 };
 DeclarationName declarationName(std::string_view declaration);
 
+// Whether this is what stands behind a dollar sign: a name, with a prefix or without.
+bool isVariableName(std::string_view text);
+
 // The names behind dollar signs that occur in the text.
 std::vector<std::string> variablesIn(std::string_view text);
 

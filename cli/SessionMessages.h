@@ -6,9 +6,9 @@
 
 namespace cli {
 
-// Messages and plans count lines from the start of the prolog: the same with lines counted from the
-// start of what was entered. Lines of the prolog itself stay what they are.
-std::string withoutPrologLines(const std::string& text, size_t prologLines);
+// A plan counts lines from the start of the prolog: the same with lines counted from the start of
+// what was entered. Lines of the prolog itself stay what they are.
+std::string withoutPrologLines(const std::string& plan, size_t prologLines);
 
 // The import of a library module: of its first declaration and the URL of its file.
 std::string importOfModule(const std::string& moduleDeclaration, const std::string& URL);

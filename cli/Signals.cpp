@@ -40,6 +40,11 @@ void handleSignals() {
 
 void surviveInterrupts() {
   survivesInterrupts = true;
+  struct sigaction action {};
+  if (sigaction(SIGINT, nullptr, &action) != 0 || action.sa_handler != handle) return;
+  // What waits for a pipe is to notice.
+  action.sa_flags &= ~SA_RESTART;
+  sigaction(SIGINT, &action, nullptr);
 }
 
 const std::shared_ptr<std::atomic<bool>>& interruption() {

@@ -1,5 +1,6 @@
 // What standard error says of the place of an error and the calls that led there.
 #include "cli/Command.h"
+#include "cli/Terminal.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -7,8 +8,10 @@
 #include <string>
 
 using command::Outcome;
+using command::plain;
 using command::shell;
 using command::TemporaryDirectory;
+using command::Terminal;
 using command::xquery;
 using testing::EndsWith;
 using testing::HasSubstr;
@@ -88,6 +91,30 @@ TEST(Places, ATabIsOneBlank) {
   EXPECT_EQ(placeOf("\t1 idiv 0"), "  at query:1:2\n  1 |  1 idiv 0\n    |  ^^^^^^^^\n");
 }
 
+TEST(Places, AreMarkedBelowWhateverTheWidthOfCharacters) {
+  EXPECT_EQ(placeOf("'漢字', 1 idiv 0"),
+            "  at query:1:7\n  1 | '漢字', 1 idiv 0\n    |         ^^^^^^^^\n");
+  EXPECT_EQ(placeOf("'e\u0301\u200D', 1 idiv 0"),
+            "  at query:1:8\n  1 | 'e\u0301\u200D', 1 idiv 0\n    |      ^^^^^^^^\n");
+  EXPECT_EQ(placeOf("'😀' + 1"), "  at query:1:1\n  1 | '😀' + 1\n    | ^^^^^^^^\n");
+}
+
+TEST(Places, OfALongLineOfWideCharactersFitTheTerminal) {
+  const std::string shown =
+      placeOf("'" + repeated("漢", 300) + "', 1 idiv 0, '" + repeated("字", 300) + "'");
+  const size_t text = shown.find("1 idiv 0"), mark = shown.find("^^^^^^^^\n");
+  ASSERT_NE(text, shown.npos);
+  ASSERT_NE(mark, shown.npos);
+  const size_t line = shown.rfind('\n', text) + 1;
+  size_t columns = 0;
+  for (size_t at = line; at < text; ++at) {
+    const bool isFirst = (static_cast<unsigned char>(shown[at]) & 0xC0) != 0x80;
+    if (isFirst) columns += static_cast<unsigned char>(shown[at]) >= 0x80 ? 2 : 1;
+  }
+  EXPECT_EQ(columns, mark - shown.rfind('\n', mark) - 1) << shown;
+  EXPECT_LT(columns, 72u);
+}
+
 TEST(Places, ControlCharactersAreMadeVisible) {
   EXPECT_EQ(placeOf("'\xC2\x9B', 1 idiv 0"),
             "  at query:1:6\n  1 | '\\u009B', 1 idiv 0\n    |           ^^^^^^^^\n");
@@ -107,6 +134,26 @@ TEST(Places, OfALongLineThePartAroundThePlaceIsShown) {
   EXPECT_EQ(marks, 1u) << shown;
   const size_t text = shown.find("2 idiv 0"), mark = shown.find("^");
   EXPECT_EQ(text - shown.rfind('\n', text), mark - shown.rfind('\n', mark));
+}
+
+TEST(Places, FitATerminalOfTwentyColumns) {
+  for (const std::string query : {"(1, 2, 3, 4, 5)[1] idiv 0, (1, 2, 3, 4, 5, 6, 7)", "1 idiv 0",
+                                  "'漢字漢字漢字漢字', 1 idiv 0, '漢字漢字漢字漢字'"}) {
+    Terminal terminal({"--color", "never", "-e", query}, {}, 20);
+    EXPECT_EQ(terminal.end(), 1);
+    const std::string shown = plain(terminal.everything());
+    const size_t at = shown.find("\n  1 | "), end = shown.find('\n', at + 1);
+    ASSERT_NE(at, shown.npos) << shown;
+    size_t columns = 0;
+    for (const char byte : shown.substr(at + 1, end - at - 1)) {
+      const auto unit = static_cast<unsigned char>(byte);
+      columns += unit < 0x80 ? 1 : (unit & 0xC0) != 0x80 ? 2 : 0;
+    }
+    EXPECT_LE(columns, 20u) << shown;
+    EXPECT_GT(columns, 12u) << shown;
+    EXPECT_THAT(shown.substr(end), HasSubstr("\n    | "));
+    EXPECT_LE(shown.find('\n', end + 1) - end, 21u) << shown;
+  }
 }
 
 TEST(Places, AMillionCharactersInOneLineAreCutQuickly) {

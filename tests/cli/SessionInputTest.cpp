@@ -121,11 +121,10 @@ TEST(Declarations, StandInTheOrderOfTheGrammar) {
 }
 
 TEST(SessionMessages, CountLinesFromTheEntry) {
-  EXPECT_EQ(cli::withoutPrologLines("XQueryError:6 - \"x\" at line:7\n", 4),
-            "XQueryError:6 - \"x\" at line:3\n");
-  EXPECT_EQ(cli::withoutPrologLines("\"x\" at line:4\n", 4), "\"x\" at line:4\n");
-  EXPECT_EQ(cli::withoutPrologLines("{\"line\":12,\"column\":3}", 10), "{\"line\":2,\"column\":3}");
-  EXPECT_EQ(cli::withoutPrologLines("at line:9 \"line\":", 1), "at line:9 \"line\":");
+  EXPECT_EQ(cli::withoutPrologLines("query\n  FLWOR  (line 7)\n    for  (line 12)", 4),
+            "query\n  FLWOR  (line 3)\n    for  (line 8)");
+  EXPECT_EQ(cli::withoutPrologLines("+  (line 4)", 4), "+  (line 4)");
+  EXPECT_EQ(cli::withoutPrologLines("(line ) (line 9", 1), "(line ) (line 8");
 }
 
 }  // namespace

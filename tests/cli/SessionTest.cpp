@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <csignal>
+#include <fcntl.h>
 #include <fstream>
 #include <sys/stat.h>
 
@@ -91,6 +92,25 @@ TEST_F(Session, GoesOnAfterAnErrorWithItsLineInTheEntry) {
   EXPECT_EQ(session->ask("1 ]"),
             "XQueryError:3 - \"parse error invalid token (])- 1 ]\" at line:1\n"
             "  at query:1:3\n  1 | 1 ]\n    |   ^\n");
+}
+
+// Lines of the entry count from its start, those of a module from that of the module.
+TEST_F(Session, TellsTheSameLinesAsJSON) {
+  write("m.xq",
+        "module namespace m = 'urn:m';\n\n\n\ndeclare function m:f($x) {\n  1 idiv $x };\n");
+  const auto session = begin({"--quiet", "--as", "json"}, "", "", 400);
+  session->ask(":load " + path("m.xq"));
+  session->ask("declare variable $a := 1;");
+  session->ask("declare variable $b := '\"line\":9';");
+  session->ask("(1,", more);
+  const std::string own = session->ask("concat('\"line\":9', 'x') idiv 0)");
+  EXPECT_THAT(own, HasSubstr("\"place\":{\"line\":2,\"column\":1,"));
+  EXPECT_THAT(own, Not(HasSubstr("\"line\":3")));
+  session->ask("(1,", more);
+  const std::string ofModule = session->ask("m:f(0))");
+  EXPECT_THAT(ofModule, HasSubstr("m.xq\",\"line\":6,\"column\":3,"));
+  EXPECT_THAT(ofModule, HasSubstr("{\"function\":\"m:f\",\"line\":2,\"column\":1,"));
+  EXPECT_THAT(ofModule, HasSubstr(",\"line\":6,\"category\"")) << "as the module has it";
 }
 
 TEST_F(Session, KeepsWhatIsDeclared) {
@@ -365,6 +385,39 @@ TEST_F(Session, SurvivesAnInterruptOfItsOutput) {
   session->type("\x03");
   EXPECT_THAT(session->waitFor("\nxquery> "), HasSubstr("xquery: interrupted"));
   EXPECT_EQ(session->ask("'still there'"), "still there\n");
+}
+
+TEST_F(Session, SurvivesAnInterruptOfReading) {
+  const std::string pipe = path("pipe.xml");
+  ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
+  const auto session = begin();
+  const auto interrupt = [&] {
+    usleep(300'000);
+    session->type("\x03");
+    EXPECT_THAT(session->waitFor("\nxquery> "), HasSubstr("xquery: interrupted"));
+    EXPECT_EQ(session->ask("1"), "1\n");
+  };
+  session->type(":doc a " + pipe + "\n");  // which nobody writes to
+  interrupt();
+  session->type(":load " + pipe + "\n");
+  interrupt();
+  const int side = open(pipe.c_str(), O_RDWR | O_CLOEXEC);
+  ASSERT_EQ(::write(side, "<a>", 3), 3);
+  session->type(":doc a " + pipe + "\n");  // which comes to no end
+  interrupt();
+  close(side);
+  EXPECT_THAT(session->ask("$a"), StartsWith("XQueryError:8"));
+  EXPECT_EQ(session->ask(":doc a " + std::string(books())), "");
+  EXPECT_EQ(session->ask("count($a//book)"), "4\n");
+}
+
+TEST_F(Session, AnInterruptBeforeItBeginsEndsTheCommand) {
+  const std::string pipe = path("pipe.xml");
+  ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
+  Terminal session({pipe}, environment());
+  usleep(500'000);
+  session.type("\x03");
+  EXPECT_EQ(session.end(), -SIGINT);
 }
 
 TEST_F(Session, DropsWhatWasTypedAtAnInterrupt) {

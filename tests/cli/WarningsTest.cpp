@@ -63,7 +63,7 @@ TEST(Warnings, AreObjectsWhereTheResultIs) {
   EXPECT_EQ(outcome.status, 0);
   EXPECT_EQ(outcome.err,
             "{\"warning\":\"unused-variable\",\"message\":\"variable $a is never used\",\"line\":2,"
-            "\"column\":6}"
+            "\"column\":6,\"length\":6}"
             "\n");
 }
 
