@@ -192,6 +192,7 @@ void checkTogether(const Options& options) {
   if (isWhole && options.separator) {
     throw WrongUsage("--separator does not go with --as xml and --as json");
   }
+  if (options.check && options.plan) throw WrongUsage("--check does not go with --plan");
   if (options.indent && (options.format == Format::HTML || options.format == Format::Text)) {
     throw WrongUsage("--indent does not go with --as html and --as text");
   }
@@ -260,10 +261,13 @@ std::string_view withoutDashes(std::string_view name) {
 std::string nearestOption(const std::string& wrong) {
   constexpr size_t longest = 32;
   const std::string_view name = withoutDashes(wrong);
+  constexpr size_t leastOfStart = 3;
   std::string nearest;
-  size_t least = name.size() / 3 + 1;
+  size_t least = (name.size() + 1) / 3;
   if (name.size() > longest) return nearest;
   for (const OptionRow& row : optionRows()) {
+    const bool isStart = name.size() >= leastOfStart && withoutDashes(row.name).starts_with(name);
+    if (isStart) return row.name;
     const size_t steps = distance(name, withoutDashes(row.name));
     if (steps > least || withoutDashes(row.name).size() <= steps) continue;
     if (steps == least && !nearest.empty()) continue;

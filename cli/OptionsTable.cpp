@@ -1,5 +1,6 @@
 #include "OptionsTable.h"
 
+#include "SessionInput.h"
 #include "xquery/xquery.h"
 
 #include <algorithm>
@@ -28,6 +29,12 @@ void set(const OptionRow&, const std::string&, Options& options) {
 
 template <auto member>
 void take(const OptionRow&, const std::string& value, Options& options) {
+  options.*member = value;
+}
+
+template <auto member>
+void takeFile(const OptionRow& row, const std::string& value, Options& options) {
+  if (value.empty()) refuse(row, "the name of a file", value);
   options.*member = value;
 }
 
@@ -70,7 +77,7 @@ Binding split(const OptionRow& row, const std::string& text) {
 
 Binding splitNamed(const OptionRow& row, const std::string& text) {
   Binding binding = split(row, text);
-  if (binding.name.empty()) refuse(row, "a name, \"=\" and a value", text);
+  if (!isVariableName(binding.name)) refuse(row, "a name, \"=\" and a value", text);
   return binding;
 }
 
@@ -87,14 +94,15 @@ void takeVariable(const OptionRow& row, const std::string& text, Options& option
 
 // The path may be any bytes.
 void takeDocument(const OptionRow& row, const std::string& text, Options& options) {
-  const Binding binding = splitNamed(row, text);
-  needText(row, binding.name);
-  options.documents.push_back(binding);
+  needText(row, text.substr(0, text.find('=')));
+  options.documents.push_back(splitNamed(row, text));
 }
 
 void takeNamespace(const OptionRow& row, const std::string& text, Options& options) {
   needText(row, text);
   const Binding binding = split(row, text);
+  const bool isPrefix = binding.name.find(':') == std::string::npos && isVariableName(binding.name);
+  if (!binding.name.empty() && !isPrefix) refuse(row, "a prefix, \"=\" and a URI", text);
   options.namespaces[binding.name] = binding.value;
 }
 
@@ -199,7 +207,7 @@ constexpr OptionRow rows[] = {
      "Read INPUT as HTML, and documents of --doc that are not named .xml", set<&Options::html>},
     {ofInput, "--files-from", Takes::Value, "LIST", Offers::Files,
      "Read more INPUTs from a file, a line each or with a zero behind each",
-     take<&Options::filesFrom>},
+     takeFile<&Options::filesFrom>},
     {ofInput, "--jobs", Takes::Value, "N", Offers::Nothing,
      "Work on N inputs at a time; without it, one for each processor", count<&Options::jobs, 1024>},
     {ofInput, "--strip-space", Takes::Nothing, "", Offers::Nothing,
@@ -231,7 +239,7 @@ constexpr OptionRow rows[] = {
     {ofResult, "--exit-status", Takes::Nothing, "", Offers::Nothing,
      "End with status 4 when the result is empty or false", set<&Options::exitStatus>},
     {ofResult, "-o", Takes::Value, "FILE", Offers::Files, "Write the result to a file",
-     take<&Options::outputFile>},
+     takeFile<&Options::outputFile>},
     {ofLimits, "--timeout", Takes::Value, "SECONDS", Offers::Nothing,
      "End an evaluation that takes longer", takeTimeout},
     {ofLimits, "--memory", Takes::Value, "BYTES", Offers::Nothing,

@@ -216,9 +216,9 @@ TEST_F(ResultFile, CannotBeAFolder) {
   EXPECT_EQ(outcome.err, "xquery: cannot write " + path("") + ": Is a directory\n");
 }
 
-TEST_F(ResultFile, CannotHaveAnEmptyNameOrLieInAFile) {
+TEST_F(ResultFile, CannotLieInAFile) {
   write("text");
-  for (const std::string& name : {std::string(), path("out/below"), path("nowhere/")}) {
+  for (const std::string& name : {path("out/below"), path("nowhere/")}) {
     const Outcome outcome = xquery({"-o", name, "-e", "1"});
     EXPECT_EQ(outcome.status, 3) << name;
     EXPECT_THAT(outcome.err, HasSubstr("xquery: cannot write " + name + ": ")) << name;
