@@ -119,22 +119,34 @@ Entry* allocateEntry(NSStringView text, NSStringView Entry::*textField) {
   return entry;
 }
 
+// With the counts it holds on its parts, as far as it has any.
+void freeEntry(NSXMLNamespaceURI* entry);
+void freeEntry(NSXMLExpandedName* entry);
+void freeEntry(NSXMLName* entry);
+
 template <class Entry, class Key>
 class InternTable {
  public:
-  // `create` makes an entry from the key, with its own parts interned.
-  template <class Create>
-  Entry* intern(const Key& key, Create create) {
+  // `allocate` makes an entry from the key, `fill` interns its own parts. Where there is no memory
+  // nothing is left of it.
+  template <class Allocate, class Fill>
+  Entry* intern(const Key& key, Allocate allocate, Fill fill) {
     Shard& shard = shardOf(key.hash);
     const std::lock_guard<std::mutex> guard(shard.mutex);
     if (const auto found = shard.entries.find(key); found != shard.entries.end()) {
       retain(*found);
       return *found;
     }
-    Entry* entry = create(key);
+    Entry* entry = allocate(key);
     entry->references = 1;
     entry->hash = key.hash;
-    shard.entries.insert(entry);
+    try {
+      fill(*entry, key);
+      shard.entries.insert(entry);
+    } catch (...) {
+      freeEntry(entry);
+      throw;
+    }
     return entry;
   }
 
@@ -206,9 +218,12 @@ Tables& tables() {
 
 const NSXMLNamespaceURI* internURI(NSStringView URI) {
   if (URI.isEmpty()) return nullptr;
-  return tables().URIs.intern(URIKey(URI), [](const URIKey& key) {
-    return allocateEntry<NSXMLNamespaceURI>(key.text, &NSXMLNamespaceURI::text);
-  });
+  return tables().URIs.intern(
+      URIKey(URI),
+      [](const URIKey& key) {
+        return allocateEntry<NSXMLNamespaceURI>(key.text, &NSXMLNamespaceURI::text);
+      },
+      [](NSXMLNamespaceURI&, const URIKey&) {});
 }
 
 // The tables hand out constant names; only the counts in them change.
@@ -217,12 +232,27 @@ Entry* counted(const Entry* entry) {
   return const_cast<Entry*>(entry);
 }
 
+void freeEntry(NSXMLNamespaceURI* entry) {
+  std::free(entry);
+}
+
+void freeEntry(NSXMLExpandedName* entry) {
+  if (entry->URI && tables().URIs.release(counted(entry->URI))) freeEntry(counted(entry->URI));
+  std::free(entry);
+}
+
+void freeEntry(NSXMLName* entry) {
+  if (entry->expanded) NSXMLReleaseName(entry->expanded);
+  giveRangeBlock(entry);
+}
+
 const NSXMLExpandedName* internNarrowExpandedName(NSStringView localName, NSStringView URI) {
-  return tables().expandedNames.intern(ExpandedKey(localName, URI), [](const ExpandedKey& key) {
-    auto* entry = allocateEntry<NSXMLExpandedName>(key.text, &NSXMLExpandedName::localName);
-    entry->URI = internURI(key.URI);
-    return entry;
-  });
+  return tables().expandedNames.intern(
+      ExpandedKey(localName, URI),
+      [](const ExpandedKey& key) {
+        return allocateEntry<NSXMLExpandedName>(key.text, &NSXMLExpandedName::localName);
+      },
+      [](NSXMLExpandedName& entry, const ExpandedKey& key) { entry.URI = internURI(key.URI); });
 }
 
 uint32_t prefixLengthOf(NSStringView qualifiedName) {
@@ -244,14 +274,14 @@ const NSXMLName* NSXMLInternName(NSStringView qualifiedName, NSStringView URI) {
   const NarrowText narrowName(qualifiedName);
   const NarrowText narrowURI(URI);
   return tables().names.intern(
-      NameKey(narrowName.view(), narrowURI.view()), [](const NameKey& key) {
-        auto* entry = allocateEntry<NSXMLName>(key.text, &NSXMLName::text);
-        entry->prefixLength = prefixLengthOf(key.text);
+      NameKey(narrowName.view(), narrowURI.view()),
+      [](const NameKey& key) { return allocateEntry<NSXMLName>(key.text, &NSXMLName::text); },
+      [](NSXMLName& entry, const NameKey& key) {
+        entry.prefixLength = prefixLengthOf(key.text);
         // A local name may fit the 8-bit form where its prefix does not.
         const NSStringView localName =
-            entry->prefixLength ? key.text.substring(entry->prefixLength + 1) : key.text;
-        entry->expanded = internNarrowExpandedName(NarrowText(localName).view(), key.URI);
-        return entry;
+            entry.prefixLength ? key.text.substring(entry.prefixLength + 1) : key.text;
+        entry.expanded = internNarrowExpandedName(NarrowText(localName).view(), key.URI);
       });
 }
 
@@ -268,9 +298,7 @@ void NSXMLRetainName(const NSXMLExpandedName* name) {
 }
 
 void NSXMLReleaseName(const NSXMLExpandedName* name) {
-  if (!tables().expandedNames.release(counted(name))) return;
-  if (name->URI && tables().URIs.release(counted(name->URI))) std::free(counted(name->URI));
-  std::free(counted(name));
+  if (tables().expandedNames.release(counted(name))) freeEntry(counted(name));
 }
 
 void NSXMLReleaseName(const NSXMLName* name) {
@@ -278,9 +306,7 @@ void NSXMLReleaseName(const NSXMLName* name) {
 }
 
 void NSXMLRemoveReferences(const NSXMLName* name, uint32_t count) {
-  if (!tables().names.release(counted(name), count)) return;
-  NSXMLReleaseName(name->expanded);
-  giveRangeBlock(counted(name));
+  if (tables().names.release(counted(name), count)) freeEntry(counted(name));
 }
 
 size_t NSXMLInternedNameCount() {
