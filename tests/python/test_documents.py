@@ -9,7 +9,7 @@ import io
 import os
 import threading
 from pathlib import Path
-from typing import Iterator
+from typing import Iterator, List
 
 import pytest
 
@@ -44,7 +44,8 @@ def server(tmp_path: Path) -> Iterator[str]:
 
 
 def test_a_path(file: Path) -> None:
-    for path in (file, str(file)):
+    paths: List[xquery.Source] = [file, str(file)]
+    for path in paths:
         document = xquery.parse(path)
         assert document.text == "\u00e4"
         assert document.uri == file.as_uri()

@@ -7,7 +7,7 @@ import io
 import sys
 import threading
 from pathlib import Path
-from typing import Callable
+from typing import Callable, List
 
 import pytest
 
@@ -31,7 +31,9 @@ def test_items_of_every_source() -> None:
     query = xquery.compile("for $p in //price return string($p)")
     path = Path("examples/books.xml")
     data = path.read_bytes()
-    for source in (path, str(path), data, data.decode(), io.BytesIO(data), io.StringIO(data.decode())):
+    text = data.decode()
+    sources: List[xquery.Source] = [path, str(path), data, text]
+    for source in [*sources, io.BytesIO(data), io.StringIO(text)]:
         assert list(query.stream(source)) == PRICES
     with open(path, "rb") as file:
         assert list(query.stream(file)) == PRICES

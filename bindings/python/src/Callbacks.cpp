@@ -2,6 +2,7 @@
 
 #include "Hearing.h"
 #include "Results.h"
+#include "Settings.h"
 #include "Values.h"
 
 #include <atomic>
@@ -106,8 +107,9 @@ py::object resultOf(const Value& value) {
   return py::cast(Result(NSArray::arrayWithObjects(std::move(items))));
 }
 
-void tellMissing(const py::object& missing, const XQueryMissingDocument& document) {
+void tellMissing(const Settings& settings, const XQueryMissingDocument& document) {
   const py::gil_scoped_acquire acquired;
+  const py::object missing = settings.missing;
   const py::object URL = toStr(document.URL), reason = toStr(document.reason);
   if (!missing.is_none()) {
     missing(URL, reason);
@@ -127,19 +129,18 @@ std::shared_ptr<XQueryLoader> makeLoader(const py::object& load, const py::objec
   return std::make_shared<Loader>(load, modules);
 }
 
-std::shared_ptr<XQueryClient> makeClient(const py::object& trace, const py::object& missing) {
-  const auto heard = std::make_shared<Kept>(missing);
-  MissingHearing tell = [heard](const XQueryMissingDocument& document) {
-    tellMissing(heard->get(), document);
-  };
-  if (trace.is_none()) return clientHearing(nullptr, std::move(tell));
-  const auto hears = std::make_shared<Kept>(trace);
-  return clientHearing(
-      [hears](const Value& value, const Ref<NSString>& label) {
-        const py::gil_scoped_acquire acquired;
-        hears->get()(toStr(label->view()), resultOf(value));
-      },
-      std::move(tell));
+std::shared_ptr<XQueryClient> makeClient(const Settings& settings) {
+  TraceHearing hear;
+  if (!settings.trace.is_none()) {
+    hear = [&settings](const Value& value, const Ref<NSString>& label) {
+      const py::gil_scoped_acquire acquired;
+      const py::object trace = settings.trace;
+      trace(toStr(label->view()), resultOf(value));
+    };
+  }
+  return clientHearing(std::move(hear), [&settings](const XQueryMissingDocument& document) {
+    tellMissing(settings, document);
+  });
 }
 
 void addCallbacks(py::module_& module) {

@@ -8,6 +8,8 @@
 
 namespace xquery::python {
 
+struct Settings;
+
 // Whether the interpreter's lock may be asked for. Threads of the library live on when the
 // interpreter ends, which then ends each thread that asks, by unwinding it, and C++ does not
 // survive that. So nothing is asked for once the end has begun, and a thread that was in a function
@@ -18,8 +20,9 @@ bool isInterpreterAlive();
 // None.
 std::shared_ptr<XQueryLoader> makeLoader(const py::object& load, const py::object& modules);
 
-// Without a function traces are written to the log, and missing documents are warnings.
-std::shared_ptr<XQueryClient> makeClient(const py::object& trace, const py::object& missing);
+// Calls the functions of the settings, which must live as long as it is used. Without a function
+// traces are written to the log, and missing documents are warnings.
+std::shared_ptr<XQueryClient> makeClient(const Settings& settings);
 
 void addCallbacks(py::module_& module);
 

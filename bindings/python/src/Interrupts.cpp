@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <csignal>
+#include <pthread.h>
 #include <unistd.h>
 
 namespace xquery::python {
@@ -39,25 +40,64 @@ bool isOurs(const struct sigaction& action) {
   return (action.sa_flags & SA_SIGINFO) != 0 && action.sa_sigaction == handleInterrupt;
 }
 
-// A signal that is ignored, or ends the process, is left as it is.
-void standBefore() {
-  struct sigaction now = {};
-  if (sigaction(SIGINT, nullptr, &now) != 0 || isOurs(now)) return;
-  const bool isPlain = (now.sa_flags & SA_SIGINFO) == 0;
-  if (isPlain && (now.sa_handler == SIG_DFL || now.sa_handler == SIG_IGN)) return;
-  handlerBefore = now;
-  struct sigaction ours = now;
+bool isSameHandler(const struct sigaction& a, const struct sigaction& b) {
+  return a.sa_flags == b.sa_flags && a.sa_sigaction == b.sa_sigaction;
+}
+
+// The ours that stands before a handler.
+struct sigaction oursBefore(const struct sigaction& handler) {
+  struct sigaction ours = handler;
   ours.sa_flags |= SA_SIGINFO;
   ours.sa_sigaction = handleInterrupt;
-  sigaction(SIGINT, &ours, nullptr);
+  return ours;
+}
+
+bool isStanding = false;
+
+// A signal that is ignored, or ends the process, is left as it is. An evaluation may take less time
+// than asking the system does, so that it is told first, and asked only where the handler is not
+// the one of the last time: then for that moment an interrupt went to that of the last time.
+void standBefore() {
+  struct sigaction now = {};
+  if (handlerBefore.sa_sigaction) {
+    const struct sigaction ours = oursBefore(handlerBefore);
+    isStanding = sigaction(SIGINT, &ours, &now) == 0;
+    if (isStanding && isSameHandler(now, handlerBefore)) return;
+    sigaction(SIGINT, &now, nullptr);
+  } else if (sigaction(SIGINT, nullptr, &now) != 0) {
+    return;
+  }
+  isStanding = false;
+  const bool isPlain = (now.sa_flags & SA_SIGINFO) == 0;
+  if (isOurs(now) || (isPlain && (now.sa_handler == SIG_DFL || now.sa_handler == SIG_IGN))) return;
+  handlerBefore = now;
+  const struct sigaction ours = oursBefore(now);
+  isStanding = sigaction(SIGINT, &ours, nullptr) == 0;
 }
 
 // A handler that was set meanwhile stays.
 void stepBack() {
+  if (!isStanding) return;
+  isStanding = false;
   struct sigaction now = {};
-  if (sigaction(SIGINT, nullptr, &now) == 0 && isOurs(now)) {
-    sigaction(SIGINT, &handlerBefore, nullptr);
+  if (sigaction(SIGINT, &handlerBefore, &now) == 0 && !isOurs(now)) {
+    sigaction(SIGINT, &now, nullptr);
   }
+}
+
+// Counts the forks that this process is the child of: the main thread of a child is the one that
+// forked.
+std::atomic<unsigned> forks = 0;
+
+bool isMainThread() {
+  static const int registered = pthread_atfork(nullptr, nullptr, [] { ++forks; });
+  thread_local unsigned askedAt = ~0U;
+  thread_local bool isMain = false;
+  if (const unsigned now = forks; askedAt != now || registered != 0) {
+    askedAt = now;
+    isMain = getpid() == gettid();
+  }
+  return isMain;
 }
 
 }  // namespace
@@ -86,7 +126,7 @@ void Cancellation::remove(const Flag& flag) {
 }
 
 UnderWay::UnderWay(std::shared_ptr<Cancellation> cancellation)
-    : _cancellation(std::move(cancellation)), _isMain(getpid() == gettid()) {
+    : _cancellation(std::move(cancellation)), _isMain(isMainThread()) {
   if (_isMain && nesting < mostNested) {
     _flag = flagsOfMain().at(nesting);
     _flag->store(false);

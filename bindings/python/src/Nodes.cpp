@@ -200,32 +200,50 @@ auto comparing(Test test) {
 }
 
 void addProperties(py::class_<Node>& node) {
-  node.def_property_readonly("kind", kindOf);
-  node.def_property_readonly("name",
-                             [](const Node& self) { return toStrOrNone(self.node->name()); });
-  node.def_property_readonly("local_name", [](const Node& self) {
-    return self.node->hasName() ? toStr(self.node->localNameView())
-                                : toStrOrNone(self.node->name());
-  });
-  node.def_property_readonly("prefix", prefixOf);
-  node.def_property_readonly("namespace", namespaceOf);
-  node.def_property_readonly("text", textOf);
-  node.def_property_readonly("attributes", attributesOf);
-  node.def_property_readonly("namespaces", namespacesOf);
-  node.def_property_readonly("children", childrenOf);
-  node.def_property_readonly("uri", URIOf);
-  node.def_property_readonly("path",
-                             [](const Node& self) { return toStrOrNone(self.node->XPath()); });
-  node.def_property_readonly("parent",
-                             [](const Node& self) { return nodeOrNone(self.node->parent()); });
-  node.def_property_readonly("root",
-                             [](const Node& self) { return nodeToPython(self.node->rootNode()); });
+  node.def_property_readonly("kind", kindOf,
+                             "One of \"document\", \"element\", \"attribute\", \"text\", "
+                             "\"comment\", \"processing-instruction\" and \"namespace\".");
   node.def_property_readonly(
-      "document", [](const Node& self) { return nodeOrNone(self.node->rootDocument()); });
-  node.def_property_readonly("next",
-                             [](const Node& self) { return nodeOrNone(self.node->nextSibling()); });
+      "name", [](const Node& self) { return toStrOrNone(self.node->name()); },
+      "As it is written, prefix included; None for a node without a name.");
   node.def_property_readonly(
-      "previous", [](const Node& self) { return nodeOrNone(self.node->previousSibling()); });
+      "local_name",
+      [](const Node& self) {
+        return self.node->hasName() ? toStr(self.node->localNameView())
+                                    : toStrOrNone(self.node->name());
+      },
+      "Without the prefix.");
+  node.def_property_readonly("prefix", prefixOf, "None for none.");
+  node.def_property_readonly("namespace", namespaceOf,
+                             "The URI of the namespace of the name; None for none.");
+  node.def_property_readonly("text", textOf,
+                             "The string value: the own text, or all the text below.");
+  node.def_property_readonly(
+      "attributes", attributesOf,
+      "The attributes of an element by name, as it is written; a new dict each time.");
+  node.def_property_readonly("namespaces", namespacesOf,
+                             "The namespaces in scope by prefix; None is that of the default one.");
+  node.def_property_readonly("children", childrenOf, "A new list.");
+  node.def_property_readonly("uri", URIOf,
+                             "Where the document was read from, as far as that is known.");
+  node.def_property_readonly(
+      "path", [](const Node& self) { return toStrOrNone(self.node->XPath()); },
+      "The path that leads from the root to this node alone.");
+  node.def_property_readonly(
+      "parent", [](const Node& self) { return nodeOrNone(self.node->parent()); },
+      "None for a root.");
+  node.def_property_readonly(
+      "root", [](const Node& self) { return nodeToPython(self.node->rootNode()); },
+      "The topmost node.");
+  node.def_property_readonly(
+      "document", [](const Node& self) { return nodeOrNone(self.node->rootDocument()); },
+      "The document that the node is in; None for a tree without one.");
+  node.def_property_readonly(
+      "next", [](const Node& self) { return nodeOrNone(self.node->nextSibling()); },
+      "The sibling after this one, or None.");
+  node.def_property_readonly(
+      "previous", [](const Node& self) { return nodeOrNone(self.node->previousSibling()); },
+      "The sibling before this one, or None.");
 }
 
 void addComparison(py::class_<Node>& node) {
@@ -251,22 +269,55 @@ py::object nodeOrNone(const NSXMLNode* node) {
   return node ? nodeToPython(node) : py::none();
 }
 
+constexpr const char* documentation = R"doc(A node of a document, or one that a query has made.
+
+Trees are not changed from Python, and any number of threads may read one. A node keeps its tree.
+Nodes are equal when they are the same one, and are ordered as in the document. Iterating gives the
+children; len() counts them, and a node is true whether it has some or not.
+
+>>> import xquery
+>>> books = xquery.parse("examples/books.xml")
+>>> book = books.find("//book[1]")
+>>> book.kind, book.name, book.get("isbn"), book.find("price").text
+('element', 'book', '0-306-40615-2', '24.50')
+>>> [child.name for child in book if child.kind == "element"]
+['title', 'author', 'author', 'year', 'price']
+>>> book.find_all("author/string()")
+<xquery.Result ['Ada Moss', 'Peter Stone']>
+>>> book.parent < book and book == books.find("/*/book[1]")
+True
+>>> book.find("year").xml()
+'<year>1998</year>'
+)doc";
+
 void addNodes(py::module_& module) {
   py::class_<Walk>(module, "_Walk")
       .def("__iter__", [](py::object self) { return self; })
       .def("__next__", nextOf);
-  py::class_<Node> node(module, "Node", py::is_final());
+  py::class_<Node> node(module, "Node", py::is_final(), documentation);
   addProperties(node);
   addComparison(node);
-  node.def("get", attributeNamed, py::arg("name"), py::arg("default") = py::none());
-  node.def("xml", XMLOf, py::kw_only(), py::arg("indent") = false);
-  node.def("find", findFirst, py::arg("path"));
-  node.def("find_all", findAll, py::arg("path"));
-  node.def("walk", [](const Node& self) { return Walk{self.node, self.node.get(), true}; });
-  node.def("copy", [](const Node& self) {
-    const Ref<NSXMLNode> copy = self.node->copy();
-    return nodeToPython(copy.get());
-  });
+  node.def("get", attributeNamed, py::arg("name"), py::arg("default") = py::none(),
+           "The value of an attribute by its name as written.");
+  node.def("xml", XMLOf, py::kw_only(), py::arg("indent") = false,
+           "As XML, with the namespaces that it needs; indented for people to read.");
+  node.def("find", findFirst, py::arg("path"),
+           "The first item of what a path, or any other query, answers for the node, or "
+           "None.\n\nNothing is loaded for it.");
+  node.def("find_all", findAll, py::arg("path"), "All the items, as a Result.");
+  node.def(
+      "walk",
+      [](const Node& self) {
+        return Walk{self.node, self.node.get(), true};
+      },
+      "The node and all that are below it, attributes apart, in document order.");
+  node.def(
+      "copy",
+      [](const Node& self) {
+        const Ref<NSXMLNode> copy = self.node->copy();
+        return nodeToPython(copy.get());
+      },
+      "A tree of its own, without a parent.");
   node.def("__iter__", [](const Node& self) {
     return Walk{self.node, self.node->firstChild(), false};
   });

@@ -1,5 +1,6 @@
 #include "Queries.h"
 
+#include "Callbacks.h"
 #include "Errors.h"
 #include "Nodes.h"
 #include "Results.h"
@@ -57,13 +58,13 @@ class Prepared {
  public:
   Prepared(XQueryContext& context, const Settings& settings, const UnderWay& underWay, bool isKept)
       : _context(context), _settings(settings), _isKept(isKept) {
-    context.contextSetLoading(settings.loadingOfDocuments());
-    context.contextSetClient(settings.client());
+    if (!settings.isLoadingPlain()) context.contextSetLoading(settings.loadingOfDocuments());
+    context.contextSetClient(settings.client);
     context.contextSetLimits(settings.limitsOf(underWay));
   }
   ~Prepared() {
     if (!_isKept) return;
-    _context.contextSetLoading(_settings.loading);
+    if (!_settings.isLoadingPlain()) _context.contextSetLoading(_settings.loading);
     _context.contextSetClient(nullptr);
     _context.contextSetLimits(_settings.limits);
   }
@@ -230,7 +231,9 @@ const Settings& settingsOfPaths() {
   static const auto* settings = [] {
     auto* own = new Settings;
     own->loading.policy = XQueryLoadingPolicy::denyAll();
+    own->hasPlainPolicy = false;
     own->loader = own->modules = own->trace = own->missing = py::none();
+    own->client = makeClient(*own);
     return own;
   }();
   return *settings;

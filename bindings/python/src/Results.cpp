@@ -7,8 +7,6 @@
 namespace xquery::python {
 namespace {
 
-// An iterator of Python's own over a list takes less time for each item than one of this module, so
-// items are made by pieces. A piece is short, since not everybody goes on to the end.
 struct ResultIterator {
   Result result;
   size_t next = 0;
@@ -131,13 +129,28 @@ Value Result::value() const {
   return NSArray::arrayWithObjects(std::move(some));
 }
 
+constexpr const char* documentation = R"doc(The items of a result, as an immutable sequence.
+
+An item becomes an object of Python when it is asked for; docs/python.md has the types. Slices are
+results as well.
+
+>>> import xquery
+>>> items = xquery.query("1 to 10")
+>>> len(items), items[0], items[-1], items[2:4]
+(10, 1, 10, <xquery.Result [3, 4]>)
+>>> sum(items)
+55
+>>> items == list(range(1, 11))
+True
+)doc";
+
 void addResults(py::module_& module) {
   py::class_<ResultIterator>(module, "_ResultIterator")
       .def("__iter__", [](py::object self) { return self; })
       .def("__next__", nextOf)
       .def("__length_hint__",
            [](const ResultIterator& self) { return self.result.count - self.next; });
-  py::class_<Result> result(module, "Result", py::is_final());
+  py::class_<Result> result(module, "Result", py::is_final(), documentation);
   result.def("__len__", [](const Result& self) { return self.count; });
   result.def("__getitem__", itemAt);
   result.def("__getitem__", sliceOf);
@@ -145,14 +158,16 @@ void addResults(py::module_& module) {
   result.def("__eq__", isEqual);
   result.attr("__hash__") = py::none();
   result.def("__repr__", representation);
-  result.def("index", indexOf, py::arg("value"), py::arg("start") = 0,
-             py::arg("stop") = py::none());
-  result.def("count", countOf, py::arg("value"));
-  result.def("first", firstOf, py::arg("default") = py::none());
-  result.def("one", oneOf);
-  result.def("to_list", [](const Result& self) { return pieceOf(self, 0, self.count); });
-  result.def("strings", stringsOf);
-  result.def_property_readonly("types", typesOf);
+  result.def("index", indexOf, py::arg("value"), py::arg("start") = 0, py::arg("stop") = py::none(),
+             "The place of the first item that equals the value; ValueError for none.");
+  result.def("count", countOf, py::arg("value"), "How many items equal the value.");
+  result.def("first", firstOf, py::arg("default") = py::none(),
+             "The first item, or the value given where there is none.");
+  result.def("one", oneOf, "The only item; ValueError where there is another number of them.");
+  result.def(
+      "to_list", [](const Result& self) { return pieceOf(self, 0, self.count); }, "All items.");
+  result.def("strings", stringsOf, "The string values of all items.");
+  result.def_property_readonly("types", typesOf, "The types of all items, as a query writes them.");
 }
 
 }  // namespace xquery::python

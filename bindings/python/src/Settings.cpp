@@ -74,6 +74,8 @@ std::shared_ptr<Settings> make(const std::optional<double>& seconds,
   settings->modules = functionOrNone(modules, "modules");
   settings->trace = functionOrNone(trace, "trace");
   settings->missing = functionOrNone(missing, "missing");
+  settings->hasPlainPolicy = py::len(policy) == 0;
+  settings->client = makeClient(*settings);
   return settings;
 }
 
@@ -131,10 +133,6 @@ XQueryLoading Settings::loadingOfModules() const {
   XQueryLoading own = loading;
   if (!loader.is_none() || !modules.is_none()) own.loader = makeLoader(loader, modules);
   return own;
-}
-
-std::shared_ptr<XQueryClient> Settings::client() const {
-  return makeClient(trace, missing);
 }
 
 void addSettings(py::module_& module) {

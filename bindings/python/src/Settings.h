@@ -16,12 +16,16 @@ struct Settings {
   std::map<std::string, std::string> namespaces;
   std::shared_ptr<Cancellation> cancellation;
   py::object loader, modules, trace, missing;  // None for none
+  bool hasPlainPolicy = true;
+  // Hears for these functions as long as the settings live.
+  std::shared_ptr<XQueryClient> client;
 
   XQueryLimits limitsOf(const UnderWay& underWay) const;
+  // Whether documents are loaded as a context does without being told.
+  bool isLoadingPlain() const { return hasPlainPolicy && loader.is_none(); }
   // For a compilation, which may have a loader of modules of its own.
   XQueryLoading loadingOfModules() const;
   XQueryLoading loadingOfDocuments() const;
-  std::shared_ptr<XQueryClient> client() const;
 };
 
 }  // namespace xquery::python

@@ -57,16 +57,18 @@ struct Channel {
 
 class Stream {
  public:
-  Stream(const Compiled& compiled, const Settings& settings, std::string path, py::object read,
-         std::string name, const py::dict& variables)
+  Stream(const Compiled& compiled, std::shared_ptr<Settings> kept, std::string path,
+         py::object read, std::string name, const py::dict& variables)
       : _query(compiled.query),
+        _settings(std::move(kept)),
         _read(std::move(read)),
         _name(std::move(name)),
         _constants(constantsFrom(variables)),
-        _cancellation(settings.cancellation) {
+        _cancellation(_settings->cancellation) {
+    const Settings& settings = *_settings;
     _context = XQueryContext::xqueryContextWithNamespaces(settings.namespaces);
     _context->contextSetLoading(settings.loadingOfDocuments());
-    _context->contextSetClient(settings.client());
+    _context->contextSetClient(settings.client);
     XQueryLimits limits = settings.limits;
     limits.cancelled = _flag;
     _context->contextSetLimits(limits);
@@ -190,6 +192,7 @@ class Stream {
   }
 
   Ref<XQuery> _query;
+  std::shared_ptr<Settings> _settings;
   Ref<XQueryContext> _context;
   py::object _read;
   std::string _name;
@@ -206,8 +209,8 @@ class Stream {
 
 void addStreams(py::module_& module) {
   py::class_<Stream>(module, "Stream")
-      .def(py::init<const Compiled&, const Settings&, std::string, py::object, std::string,
-                    const py::dict&>())
+      .def(py::init<const Compiled&, std::shared_ptr<Settings>, std::string, py::object,
+                    std::string, const py::dict&>())
       .def("__next__", &Stream::next)
       .def("close", &Stream::close);
 }
