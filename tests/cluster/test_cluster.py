@@ -196,6 +196,8 @@ def test_queries_that_do_not_compile_are_raised_here(two_workers):
         xc.map(two_workers.client, "//a", [], combine="1 +")
     with pytest.raises(ValueError):
         xc.map(two_workers.client, "//a", [], fold=True)
+    with pytest.raises(ValueError):
+        xc.map(two_workers.client, "//a", [], batch=0)
 
 
 # --- large documents ------------------------------------------------------------------------------

@@ -142,6 +142,8 @@ def map(
         raise ValueError("the client is asynchronous")
     if fold and combine is None:
         raise ValueError("fold requires combine")
+    if batch is not None and batch < 1:
+        raise ValueError("batch must be 1 or more")
     work = _Work(
         query=_pickled(query),
         fold=_pickled(combine) if combine is not None and fold else None,
