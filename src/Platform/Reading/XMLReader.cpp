@@ -9,17 +9,13 @@
 #include "Platform/Reading/LibXML.h"
 #include "Platform/Reading/MarkedText.h"
 #include "Platform/Reading/NotTaken.h"
-#include "Platform/Reading/ProjectedElements.h"
-#include "Platform/Reading/ReadNames.h"
-#include "Platform/Reading/ReadTree.h"
-#include "Platform/Reading/References.h"
+#include "Platform/Reading/ProjectedTags.h"
 #include "Platform/Reading/XMLCharacters.h"
 #include "Platform/Reading/XMLPieces.h"
 #include "Platform/Reading/XMLProlog.h"
 #include "Platform/Text/ASCII.h"
 #include "Platform/Text/UTF8.h"
 
-#include <algorithm>
 #include <cstring>
 #include <new>
 #include <optional>
@@ -45,8 +41,7 @@ class XMLReader {
   // Of the document only that is made; it outlives the reader.
   XMLReader(TextSource& source, uint32_t options, const XMLProjection& projection)
       : _source(source), _tree(options, bytesBeforeAny), _names(_tree.tree()) {
-    _projected.emplace(_tree, projection);
-    _names.select([this](std::string_view name) { return _projected->nameOf(name); });
+    _projected.emplace(_tree, _names, _texts, projection);
   }
   NSXMLDocument* read();
 
@@ -69,32 +64,6 @@ class XMLReader {
   }
 
  private:
-  // What has been seen of a run of text or a value: whether it stands for itself.
-  struct Raw {
-    const char* begin = nullptr;
-    const char* end = nullptr;
-    uint64_t wide = 0;
-    bool isPlain = true;
-
-    std::string_view bytes() const { return {begin, static_cast<size_t>(end - begin)}; }
-    // Whether nothing is left to be looked at, whoever needs it.
-    bool isSurelyRight() const {
-      return isPlain && !wide && static_cast<size_t>(end - begin) <= longestPieceTaken;
-    }
-  };
-  struct Attribute {
-    ReadName* name;
-    Raw value;
-    const NSStringView* URI = nullptr;  // that it declares, in the tree; null for none
-  };
-
-  // What an element is known by that waits for something below it to be put into the tree.
-  struct Waiting {
-    ReadName* name;
-    const ReadNamespace* URI;
-  };
-  using Projected = ProjectedElements<Waiting>;
-
   void start();
   bool getMore();
   const char* readPiece(const char* at);
@@ -105,54 +74,41 @@ class XMLReader {
 
   const char* readText(const char* at);
   bool isFollowedBySection(const char* at) const;
-  void addText(const Raw& text, bool isWhole);
-  ReadText knownText(const Raw& text);
+  void addText(const RawText& text, bool isWhole);
 
   ReadName* readName(const char*& at);
   const char* readStartTag(const char* at);
   const char* readAttribute(const char* at);
   const char* readEquals(const char* at) const;
-  const char* readValue(const char* at, char quote, Raw& value);
+  const char* readValue(const char* at, char quote, RawText& value);
   const char* skipSpace(const char* at) const;
   void openElement(ReadName& name);
   void closeElement();
   void declareNamespaces();
-  void addNamespaces();
   void addAttributes();
-  void openProjected(ReadName& name);
-  void buildAbove();
-  bool hasNeededAttribute(const Projected::States::State& state) const;
-  void addNeededAttributes(const Projected::States::State& state);
-  void checkTag();
-  void checkDistinct();
-  ReadText valueOf(const Raw& value);
   const char* readEndTag(const char* at);
 
   const char* readComment(const char* at);
   const char* readSection(const char* at);
   const char* readInstruction(const char* at);
-  ReadText linesOf(Raw raw);
-  ReadText textOf(std::string_view bytes, uint64_t wide) const;
+  ReadText linesOf(RawText raw);
 
   TextSource& _source;
   ReadTree _tree;
   ReadNames _names;
+  RawTexts _texts;
   MarkedText _text;
   const char* _at = nullptr;
   const char* _end = nullptr;
   std::vector<ReadName*, ValueAllocator<ReadName*>> _open;  // the elements
-  std::vector<Attribute, ValueAllocator<Attribute>> _attributes;
+  ReadTag _tag;                                             // that is being read
   AttributeSet _distinct;
-  ValueText<char> _scratch;
-  bool _declares = false;  // the tag that is being read
-  bool _hasScope = false;  // it does, or has attributes of XML's own
-  bool _isASCII = false;   // as declared
   bool _hasBegun = false;
   bool _hasType = false;
   bool _hasRoot = false;
 
   static constexpr size_t bytesBeforeAny = size_t{1} << 14;
-  std::optional<Projected> _projected;
+  std::optional<ProjectedTags> _projected;
 
   bool _isByPieces = false;
   const char* _pieceStart = nullptr;  // of the last one
@@ -222,8 +178,8 @@ const char* XMLReader::readProlog(const char* at) {
       take(_source.isUnfinished());
       return nullptr;
     }
-    _isASCII = declaration.isASCII;
-    take(!_isASCII || *at == '<');
+    if (declaration.isASCII) _texts.expectASCII();
+    take(!declaration.isASCII || *at == '<');
   }
   _hasBegun = true;
   return next;
@@ -261,20 +217,8 @@ const char* XMLReader::readDeclarationLike(const char* at) {
 
 // --- text ------------------------------------------------------------------------------------
 
-// Whether the text, of one byte at least, begins with what goes on with a character.
-bool isCutBefore(std::string_view bytes) {
-  return (static_cast<unsigned char>(bytes.front()) & 0xC0U) == 0x80;
-}
-
-// Text beside a section is looked at together with it: the one must not complete a character of
-// the other.
-ReadText XMLReader::textOf(std::string_view bytes, uint64_t wide) const {
-  take(bytes.size() <= longestPieceTaken && !(wide && (_isASCII || isCutBefore(bytes))));
-  return {bytes, wide == 0};
-}
-
 const char* XMLReader::readText(const char* at) {
-  Raw text;
+  RawText text;
   text.begin = at;
   for (;; ++at) {
     at = _text.textEnd(at, text.wide);
@@ -298,20 +242,12 @@ bool XMLReader::isFollowedBySection(const char* at) const {
   return at[1] == '!';
 }
 
-ReadText XMLReader::knownText(const Raw& text) {
-  const ReadText known = textOf(text.bytes(), text.wide);
-  if (text.isPlain) return known;
-  _scratch.clear();
-  appendTextOf(known.bytes, _scratch);
-  return ReadText(_scratch);
-}
-
-void XMLReader::addText(const Raw& text, bool isWhole) {
+void XMLReader::addText(const RawText& text, bool isWhole) {
   const bool isNeeded = !_projected || _projected->needsTexts();
   if (!isNeeded && text.isSurelyRight()) return;
-  const ReadText known = knownText(text);
+  const ReadText known = _texts.content(text);
   if (!isNeeded) return _tree.check(known);
-  if (_projected) buildAbove();
+  if (_projected) _projected->buildAbove();
   if (isWhole && !_tree.hasText()) {
     _tree.addWholeText(known);
   } else {
@@ -337,7 +273,7 @@ ReadName* XMLReader::readName(const char*& at) {
   uint64_t wide = 0;
   const char* const begin = at;
   at = _text.nameEnd(begin, wide);
-  take(!(wide && _isASCII) && static_cast<size_t>(at - begin) <= longestNameTaken);
+  take(!(wide && _texts.expectsASCII()) && static_cast<size_t>(at - begin) <= longestNameTaken);
   return at == _end ? nullptr : _names.find(begin, at, _end);
 }
 
@@ -345,8 +281,7 @@ const char* XMLReader::readStartTag(const char* at) {
   take(!_open.empty() || !_hasRoot);
   ReadName* const name = readName(++at);
   if (!name) return nullptr;
-  _attributes.clear();
-  _declares = _hasScope = false;
+  _tag.clear();
   for (;;) {
     const char* const next = skipSpace(at);
     if (next == _end) return nullptr;
@@ -376,20 +311,18 @@ const char* XMLReader::readEquals(const char* at) const {
 }
 
 const char* XMLReader::readAttribute(const char* at) {
-  Attribute attribute = {readName(at), {}, {}};
+  ReadAttribute attribute = {readName(at), {}, {}};
   if (!attribute.name) return nullptr;
   at = readEquals(at);
   if (!at) return nullptr;
   take(*at == '"' || *at == '\'');
   at = readValue(at + 1, *at, attribute.value);
   if (!at) return nullptr;
-  if (attribute.name->declares) _declares = true;
-  if (attribute.name->declares || attribute.name->isOfXML) _hasScope = true;
-  _attributes.push_back(attribute);
+  _tag.add(attribute);
   return at;
 }
 
-const char* XMLReader::readValue(const char* at, char quote, Raw& value) {
+const char* XMLReader::readValue(const char* at, char quote, RawText& value) {
   value.begin = at;
   for (;; ++at) {
     at = _text.valueEnd(at, value.wide);
@@ -403,51 +336,36 @@ const char* XMLReader::readValue(const char* at, char quote, Raw& value) {
   return at + 1;
 }
 
-ReadText XMLReader::valueOf(const Raw& value) {
-  const ReadText known = textOf(value.bytes(), value.wide);
-  if (value.isPlain) return known;
-  _scratch.clear();
-  appendValueOf(known.bytes, _scratch);
-  return ReadText(_scratch);
-}
-
 void XMLReader::declareNamespaces() {
   _names.startTag();
   const auto store = [this](std::string_view URI) {
     return _isByPieces ? _tree.storedLasting(ReadText(URI)) : _tree.stored(ReadText(URI));
   };
-  for (Attribute& attribute : _attributes) {
+  for (ReadAttribute& attribute : _tag.attributes) {
     if (!attribute.name->declares) continue;
-    attribute.URI = _names.declare(*attribute.name->declares, valueOf(attribute.value).bytes,
+    attribute.URI = _names.declare(*attribute.name->declares, _texts.value(attribute.value).bytes,
                                    _open.size(), store);
   }
 }
 
 // The namespaces of a tag are in scope in all of it.
 void XMLReader::openElement(ReadName& name) {
-  if (_declares) declareNamespaces();
+  if (_tag.declares) declareNamespaces();
   _open.push_back(&name);
   _hasRoot = true;
-  if (_projected) return openProjected(name);
+  if (_projected) return _projected->open(name, _tag);
   _tree.openElement(_names.elementName(name));
-  if (_declares) addNamespaces();
-  if (!_attributes.empty()) addAttributes();
-}
-
-void XMLReader::addNamespaces() {
-  for (const Attribute& attribute : _attributes) {
-    ReadPrefix* const prefix = attribute.name->declares;
-    if (prefix) _tree.addNamespace(_names.declarationName(*prefix), attribute.URI);
-  }
+  if (_tag.declares) _tag.addNamespaces(_tree, _names);
+  if (!_tag.attributes.empty()) addAttributes();
 }
 
 void XMLReader::addAttributes() {
-  _distinct.start(_attributes.size());
-  for (const Attribute& attribute : _attributes) {
+  _distinct.start(_tag.attributes.size());
+  for (const ReadAttribute& attribute : _tag.attributes) {
     if (attribute.name->declares) continue;
     const NSXMLName* const name = _names.attributeName(*attribute.name);
     take(_distinct.insert(name->expanded));
-    _tree.addAttribute(name, valueOf(attribute.value));
+    _tree.addAttribute(name, _texts.value(attribute.value));
   }
 }
 
@@ -455,77 +373,6 @@ void XMLReader::closeElement() {
   if (!_projected || _projected->close()) _tree.closeElement();
   _open.pop_back();
   _names.endElement(_open.size());
-}
-
-// --- what is projected -----------------------------------------------------------------------
-
-void XMLReader::buildAbove() {
-  _projected->buildAbove(
-      [this](const Waiting& each) { _tree.openElement(_names.elementName(*each.name, each.URI)); });
-}
-
-void XMLReader::openProjected(ReadName& name) {
-  ReadNames::checkElementName(name);
-  const auto build = [this](const Waiting& each) {
-    _tree.openElement(_names.elementName(*each.name, each.URI));
-  };
-  const auto isNeeded = [this](const Projected::States::State& state) {
-    return _hasScope || (state.needsAnyAttribute() && hasNeededAttribute(state));
-  };
-  if (!_projected->open(name.selected, {&name, name.prefix->bound}, isNeeded, build)) {
-    return checkTag();
-  }
-  _tree.openElement(_names.elementName(name));
-  if (_declares) addNamespaces();
-  if (!_attributes.empty()) addNeededAttributes(_projected->state());
-}
-
-bool XMLReader::hasNeededAttribute(const Projected::States::State& state) const {
-  return std::any_of(_attributes.begin(), _attributes.end(), [&](const Attribute& each) {
-    return !each.name->declares && state.needsAttribute(each.name->selected);
-  });
-}
-
-void XMLReader::addNeededAttributes(const Projected::States::State& state) {
-  checkDistinct();
-  for (const Attribute& attribute : _attributes) {
-    if (attribute.name->declares) continue;
-    const ReadText value = valueOf(attribute.value);
-    if (attribute.name->isOfXML || state.needsAttribute(attribute.name->selected)) {
-      _tree.addAttribute(_names.attributeName(*attribute.name), value);
-    } else {
-      _tree.check(value);
-    }
-  }
-}
-
-void XMLReader::checkTag() {
-  if (_attributes.empty()) return;
-  checkDistinct();
-  for (const Attribute& attribute : _attributes) {
-    if (!attribute.name->declares && !attribute.value.isSurelyRight()) {
-      _tree.check(valueOf(attribute.value));
-    }
-  }
-}
-
-// Names without a prefix are distinct as they are written.
-void XMLReader::checkDistinct() {
-  bool hasPrefixes = false;
-  for (const Attribute& attribute : _attributes) {
-    if (attribute.name->declares || !attribute.name->hasPrefix) continue;
-    hasPrefixes = true;
-    take(attribute.name->prefix->bound != nullptr);
-  }
-  if (_attributes.size() < 2) return;
-  _distinct.start(_attributes.size());
-  for (const Attribute& attribute : _attributes) {
-    if (attribute.name->declares) continue;
-    const void* const key =
-        hasPrefixes ? static_cast<const void*>(_names.attributeName(*attribute.name)->expanded)
-                    : attribute.name;
-    take(_distinct.insert(key));
-  }
 }
 
 const char* XMLReader::readEndTag(const char* at) {
@@ -544,16 +391,12 @@ const char* XMLReader::readEndTag(const char* at) {
 // --- comments, sections, instructions --------------------------------------------------------
 
 // Of what is not looked at for markup. Something that ends a run of text stands behind it.
-ReadText XMLReader::linesOf(Raw raw) {
+ReadText XMLReader::linesOf(RawText raw) {
   for (const char* at = raw.begin; (at = _text.textEnd(at, raw.wide)) < raw.end; ++at) {
     if (*at == '\r') raw.isPlain = false;
     take(static_cast<unsigned char>(*at) >= ' ' || *at == '\r');
   }
-  const ReadText known = textOf(raw.bytes(), raw.wide);
-  if (raw.isPlain) return known;
-  _scratch.clear();
-  appendLinesOf(known.bytes, _scratch);
-  return ReadText(_scratch);
+  return _texts.lines(raw);
 }
 
 const char* XMLReader::readComment(const char* at) {
@@ -588,7 +431,7 @@ const char* XMLReader::readSection(const char* at) {
       _tree.check(text);
       return at + 3;
     }
-    buildAbove();
+    _projected->buildAbove();
   }
   if (_isByPieces) _tree.check(text);
   _tree.addSection(text.bytes);
@@ -613,9 +456,9 @@ const char* XMLReader::readInstruction(const char* at) {
     if (_end - at < 2) return nullptr;
     if (at[1] == '>') break;
   }
-  static_cast<void>(textOf(target, !isASCII(target)));
+  static_cast<void>(_texts.written(target, !isASCII(target)));
   if (!_projected || _projected->needsInstructions()) {
-    if (_projected) buildAbove();
+    if (_projected) _projected->buildAbove();
     _tree.addInstruction(_names.target(target), linesOf({begin, at}));
   } else {
     _tree.endText();
