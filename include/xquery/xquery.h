@@ -5,6 +5,7 @@
 #include "xquery/Data.h"
 #include "xquery/Date.h"
 #include "xquery/Error.h"
+#include "xquery/LimitedWork.h"
 #include "xquery/Limits.h"
 #include "xquery/Loading.h"
 #include "xquery/Memory.h"

@@ -118,7 +118,7 @@ TEST(ProfiledExpressions, KnowWhichTextTheyStandFor) {
     places.push_back(each.label + " " + std::to_string(each.place.line) + ":" +
                      std::to_string(each.place.column) + "+" + std::to_string(each.place.length));
   }
-  EXPECT_THAT(places, ElementsAre("FLWOR 1:1+62", "for $x in 1:1+22", "(...) 1:11+12", "ne 2:7+11",
+  EXPECT_THAT(places, ElementsAre("FLWOR 1:1+61", "for $x in 1:6+16", "list 1:12+9", "ne 2:7+11",
                                   "upper-case(...) 4:8+14"));
 }
 
