@@ -23,6 +23,47 @@ int64_t countLines(std::string_view text) {
   return static_cast<int64_t>(count) + std::count(text.begin(), text.end(), '\n');
 }
 
+bool continuesCharacter(char byte) {
+  return (byte & 0xC0) == 0x80;
+}
+
+int64_t countContinuing(std::string_view text) {
+  return std::count_if(text.begin(), text.end(), continuesCharacter);
+}
+
+// Takes the text up to its first `end`, and that, off its front; without one, all of it.
+std::string_view takeTo(std::string_view& text, std::string_view end) {
+  const size_t length = std::min(text.find(end), text.size());
+  const std::string_view taken = text.substr(0, length);
+  text.remove_prefix(std::min(length + end.size(), text.size()));
+  return taken;
+}
+
+// libxml2 compares the name in an end tag with that of the start tag byte by byte, and where they
+// are the same counts a column for each byte.
+int64_t moreColumnsOfEndTags(std::string_view text) {
+  struct Construct {
+    std::string_view start, end;
+  };
+  static constexpr Construct opaque[] = {{"<!--", "-->"}, {"<![CDATA[", "]]>"}, {"<?", "?>"}};
+  int64_t more = 0;
+  for (size_t at = text.find('<'); at != text.npos; at = text.find('<')) {
+    text.remove_prefix(at);
+    const auto* const found =
+        std::find_if(std::begin(opaque), std::end(opaque),
+                     [&](const Construct& each) { return text.starts_with(each.start); });
+    if (found != std::end(opaque)) {
+      text.remove_prefix(found->start.size());
+      takeTo(text, found->end);
+    } else if (text.starts_with("</")) {
+      more += countContinuing(takeTo(text, ">"));
+    } else {
+      text.remove_prefix(1);
+    }
+  }
+  return more;
+}
+
 }  // namespace
 
 void TextPlace::pass(std::string_view text) {
@@ -35,8 +76,10 @@ void TextPlace::pass(std::string_view text, int64_t lines) {
     column = 1;
     text.remove_prefix(text.rfind('\n') + 1);
   }
-  column +=
-      std::count_if(text.begin(), text.end(), [](char byte) { return (byte & 0xC0) != 0x80; });
+  const int64_t continuing = countContinuing(text);
+  column += static_cast<int64_t>(text.size()) - continuing;
+  // Most texts are ASCII. What a window cuts in two is counted as its parts are.
+  if (continuing > 0) column += moreColumnsOfEndTags(text);
 }
 
 void TextLines::leave(std::string_view text, size_t depth) {

@@ -11,7 +11,7 @@
 
 namespace xquery {
 
-// Counted from 1; columns in characters.
+// Counted from 1; columns in characters, but for the names in end tags in bytes.
 struct TextPlace {
   int64_t line = 1;
   int64_t column = 1;

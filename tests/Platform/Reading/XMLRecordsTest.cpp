@@ -153,6 +153,20 @@ TEST(XMLRecords, AreThoseOfTheWholeTree) {
   }
 }
 
+// libxml2 counts the names in end tags by their bytes.
+TEST(XMLRecords, TellTheColumnOfAnErrorAsReadersOfTheWholeDocumentDo) {
+  for (const std::string text :
+       {"<r><b>x</b><b></r>", "<r><é>a</é><b></r>", "<r><b><漢>a</漢></b><b>ü</b><c></r>",
+        "<r>\n<b>é</b><é/><b x='é'></b><é ></é ><!-- </é> --><![CDATA[</é>]]><?p </é>?><b></r>",
+        "<r>é<b/><漢></漢>é</q></r>", "<r><b>é</b>\n<b>&#x0;</b></r>"}) {
+    NSXMLParseError error;
+    ASSERT_FALSE(NSXMLDocument::documentWithData(text, NSXMLNodeOptionsNone, &error)) << text;
+    TextSource memory(text);
+    const std::string all = actual(memory, Path("/r/b"), NSXMLNodeOptionsNone);
+    EXPECT_TRUE(all.ends_with(shownError(error))) << text << "\n" << all << shownError(error);
+  }
+}
+
 // --- what our reader does not take -----------------------------------------------------------
 
 const std::string otherDocuments[] = {
