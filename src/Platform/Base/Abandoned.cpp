@@ -32,8 +32,6 @@ class Threads {
   bool begin() {
     const std::lock_guard lock(_mutex);
     if (_count == mostThreads) return false;
-    // A child process would have no such thread, and for ever the locks that it held.
-    if (!std::exchange(_waitsAtFork, true)) ::pthread_atfork(waitForAbandonedValues, {}, {});
     ++_count;
     return true;
   }
@@ -47,13 +45,26 @@ class Threads {
     std::unique_lock lock(_mutex);
     _changed.wait(lock, [this] { return _count == 0; });
   }
+  // Until it is released on the same thread, or on the copy of it in a child process.
+  void hold() {
+    std::unique_lock lock(_mutex);
+    _changed.wait(lock, [this] { return _count == 0; });
+    static_cast<void>(lock.release());
+  }
+  void release() { _mutex.unlock(); }
 
  private:
   std::mutex _mutex;
   std::condition_variable _changed;
   std::atomic<int> _count = 0;
-  bool _waitsAtFork = false;
 };
+
+// A child process would have no such thread, and for ever the locks that it held. From before the
+// fork until after it none begins.
+[[gnu::constructor]] void waitAtFork() {
+  ::pthread_atfork([] { Threads::shared().hold(); }, [] { Threads::shared().release(); },
+                   [] { Threads::shared().release(); });
+}
 
 // Signed like the count of a thread.
 using Bytes = std::shared_ptr<std::atomic<int64_t>>;

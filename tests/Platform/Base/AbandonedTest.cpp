@@ -8,7 +8,9 @@
 
 #include <atomic>
 #include <string>
+#include <sys/wait.h>
 #include <thread>
+#include <unistd.h>
 #include <vector>
 
 namespace xquery {
@@ -60,6 +62,31 @@ TEST_F(Abandoned, LongListsAreFreedByAnotherThreadAndCountedUntilThen) {
   EXPECT_EQ(freedElsewhere, 2 * half);
   settleAbandonedValues();
   EXPECT_EQ(workMeter.valueBytes, before);
+}
+
+// A child has no thread but the one that forked, and may abandon values of its own.
+TEST_F(Abandoned, AForkWaitsForTheThread) {
+  const size_t many = AbandonedValues::manyPartsInAll;
+  abandon(witnesses(many));
+  const pid_t child = ::fork();
+  ASSERT_GE(child, 0);
+  if (child == 0) {
+    const bool isFreed = freedElsewhere == many;
+    abandonedValues = nullptr;
+    {
+      AbandonedValues abandoned;
+      abandonedValues = &abandoned;
+      witnesses(many) = nullptr;
+      abandonedValues = nullptr;
+    }
+    waitForAbandonedValues();
+    _exit(isFreed && freedElsewhere == 2 * many ? 0 : 1);
+  }
+  int status = -1;
+  ASSERT_EQ(::waitpid(child, &status, 0), child);
+  EXPECT_EQ(status, 0);
+  waitForAbandonedValues();
+  EXPECT_EQ(freedElsewhere, many);
 }
 
 TEST_F(Abandoned, FewValuesAreFreedAtOnce) {
