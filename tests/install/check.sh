@@ -42,6 +42,13 @@ case $way in
   command)
     actual=$("$work/prefix/bin/xquery" -e '//book[price > 10]/title/text()' "$books")
     expected=$'A Field Guide to Lichens\nBrücken &amp; Wege'
+    # Documents, licence and examples, and nothing that only the project's own folder has.
+    documents=$(find "$work/prefix/share/doc" -name guide.md -printf '%h')
+    for file in "$source_dir"/docs/*.md "$source_dir/LICENSE"; do
+      cmp -s "$file" "$documents/${file##*/}" || { echo "$file is not installed" >&2; exit 1; }
+    done
+    [ "$(cd "$documents/examples" && "$work/prefix/bin/xquery" --var limit=30 affordable.xq books.xml)" = \
+      "$(cd "$source_dir/examples" && "$work/prefix/bin/xquery" --var limit=30 affordable.xq books.xml)" ]
     # The manual page and the completions know every option that the help knows.
     for option in $("$work/prefix/bin/xquery" --help | grep -oE '^ +(-.,)?--[a-z-]+' |
       grep -oE -- '--.*'); do

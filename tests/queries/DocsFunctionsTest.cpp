@@ -166,5 +166,165 @@ TEST(FunctionsDocument, TheIndexNamesEachFunction) {
   }
 }
 
+// --- what is refused -----------------------------------------------------------------------------
+
+// Fewest and most arguments of a heading: "text, pattern?, ..." has two at least.
+struct Arity {
+  size_t least = 0, most = 0;
+};
+
+Arity arityOf(const std::string& heading) {
+  const size_t open = heading.find('(') + 1;
+  const std::string arguments = heading.substr(open, heading.find(") as ") - open);
+  Arity arity;
+  for (size_t at = 0; at < arguments.size();) {
+    const size_t end = std::min(arguments.find(", ", at), arguments.size());
+    const std::string each = arguments.substr(at, end - at);
+    ++arity.most;
+    if (each.find('?') == each.npos && each.find("...") == each.npos) ++arity.least;
+    at = std::min(end + 2, arguments.size());
+  }
+  return arity;
+}
+
+// Calls of the function with so many arguments, of every kind.
+std::vector<std::string> callsWith(const std::string& name, size_t count) {
+  static const std::vector<std::string> all = {"()",
+                                               "'x'",
+                                               "''",
+                                               "1",
+                                               "-1.5",
+                                               "(1, 2)",
+                                               "<a/>",
+                                               "(<a/>, <b/>)",
+                                               "xs:date('2004-01-01')",
+                                               "xs:QName('a')",
+                                               "$bytes",
+                                               "'a b'",
+                                               "<a x='y'/>/@x",
+                                               "true()",
+                                               "substring(codepoints-to-string((65536, 65)), 2)"};
+  static const std::vector<std::string> few = {"()", "'x'", "''", "1", "<a/>", "'a b'"};
+  std::vector<std::string> calls{name + "("};
+  for (size_t n = 0; n < count; ++n) {
+    std::vector<std::string> longer;
+    for (const std::string& call : calls) {
+      for (const std::string& value : n == 0 ? all : few) {
+        longer.push_back(call + (n ? ", " : "") + value);
+      }
+    }
+    calls = std::move(longer);
+  }
+  for (std::string& call : calls) call += ")";
+  return calls;
+}
+
+bool isRefused(const std::string& call, const Ref<XQueryContext>& context) {
+  static const std::string bytes =
+      "let $bytes := ext:binary-find(xs:hexBinary('0102'), xs:hexBinary('01'), "
+      "xs:hexBinary('02')) return ";
+  Ref<XQueryError> error;
+  const auto query = XQuery::xqueryWithSource(std::string_view(bytes + call));
+  static_cast<void>(context->evaluateXQuery(*query, {}, {}, &error));
+  return error && error->err() == 17;
+}
+
+// The first call that is refused; empty for none. Nothing can be loaded.
+std::string refusedCall(const std::string& name, Arity arity) {
+  constexpr size_t mostTried = 3;
+  const Ref<XQueryContext> context = XQueryContext::xqueryContext();
+  XQueryLoading loading;
+  loading.policy = XQueryLoadingPolicy::denyAll();
+  context->contextSetLoading(loading);
+  std::vector<std::string> calls;
+  // What is refused for what two arguments are to each other.
+  if (name == "fn:dateTime") {
+    calls.emplace_back("dateTime(xs:date('2004-01-01Z'), xs:time('00:00:00+01:00'))");
+  }
+  for (size_t count = arity.least; count <= std::min(arity.most, mostTried); ++count) {
+    for (const std::string& call : callsWith(name, count)) calls.push_back(call);
+  }
+  for (const std::string& call : calls) {
+    if (isRefused(call, context)) return call;
+  }
+  return {};
+}
+
+// What the document says of each function: its entry, what its section begins with, and the entry
+// that it refers to in place of repeating it.
+class Sayings {
+ public:
+  Sayings() : _document(readDocument("docs/functions.md")), _entries(readEntries()) {}
+
+  const std::vector<Entry>& entries() const { return _entries; }
+  const std::string& heading(const Entry& entry) const {
+    return _document.lines[static_cast<size_t>(entry.line) - 1];
+  }
+  std::string of(size_t index) const {
+    std::string text = own(_entries[index]);
+    for (const char* same : {"\nThe same with ", "\nThe same of "}) {
+      if (text.find(same) != text.npos && index > 0) text += own(_entries[index - 1]);
+    }
+    for (size_t i = 0; i < _entries.size(); ++i) {
+      const std::string reference = "s `" + _entries[i].name + "`";
+      if (i != index && text.find(reference) != text.npos) text += own(_entries[i]);
+    }
+    return text;
+  }
+
+ private:
+  std::string own(const Entry& entry) const {
+    const auto line = static_cast<size_t>(entry.line) - 1;
+    std::string text;
+    size_t section = line;
+    while (section > 0 && !_document.lines[section].starts_with("## ")) --section;
+    for (size_t at = section + 1; at < line && !isEntry(at); ++at) {
+      text += _document.lines[at] + "\n";
+    }
+    text += _document.lines[line] + "\n";
+    const bool isRow = _document.lines[line].starts_with("|");
+    for (size_t at = line + 1; !isRow && at < _document.lines.size() && !isHeading(at); ++at) {
+      text += _document.lines[at] + "\n";
+    }
+    return text;
+  }
+  bool isHeading(size_t line) const { return _document.lines[line].starts_with("##"); }
+  bool isEntry(size_t line) const {
+    return isHeading(line) || _document.lines[line].starts_with("| `");
+  }
+
+  Document _document;
+  std::vector<Entry> _entries;
+};
+
+TEST(FunctionsDocument, SaysOfExactlyThoseThatRefuseArgumentsThatTheyDo) {
+  const Sayings sayings;
+  for (size_t i = 0; i < sayings.entries().size(); ++i) {
+    const Entry& entry = sayings.entries()[i];
+    const std::string call = refusedCall(entry.name, arityOf(sayings.heading(entry)));
+    const bool isSaid = sayings.of(i).find("efused") != std::string::npos;
+    EXPECT_EQ(isSaid, !call.empty()) << entry.name << ", line " << entry.line << ": " << call;
+  }
+}
+
+// "Refused for this: do that", or in brackets, or as another entry says.
+TEST(FunctionsDocument, SaysWhatToDoInPlaceOfWhatIsRefused) {
+  const Document document = readDocument("docs/functions.md");
+  int refusals = 0;
+  for (const std::string& line : document.lines) {
+    if (line.starts_with("- ")) continue;  // how to read an entry
+    for (size_t at = line.find("efused"); at != line.npos; at = line.find("efused", at + 1)) {
+      ++refusals;
+      const std::string rest = line.substr(at);
+      const bool hasRemedy = rest.find(": ") != rest.npos || rest.find('(') != rest.npos ||
+                             rest.find(" as `") != rest.npos || rest.find("as above") != rest.npos;
+      EXPECT_TRUE(hasRemedy || line.find(". Use `") != line.npos ||
+                  rest.find(". Compare") != rest.npos)
+          << line;
+    }
+  }
+  EXPECT_GT(refusals, 40);
+}
+
 }  // namespace
 }  // namespace xquery::docs
