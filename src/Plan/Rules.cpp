@@ -11,6 +11,8 @@ constexpr std::array rules = {
                XQueryTakeNames},
     XQueryRule{"positions", "a position that is compared with a number is asked for by number",
                XQueryTakePositions},
+    XQueryRule{"ranges", "the items from one position to another are taken without asking each",
+               XQueryTakePositionRanges},
     XQueryRule{"walks", "no node is walked twice, and no further than needed", XQueryKeepTrails},
     XQueryRule{"constants", "what consists of literals alone is evaluated once, beforehand",
                XQueryFoldConstants},

@@ -27,6 +27,7 @@ void XQueryKeepTrails(XQueryPlanning& planning);
 void XQueryFoldConstants(XQueryPlanning& planning);
 void XQueryTakeNames(XQueryPlanning& planning);
 void XQueryTakePositions(XQueryPlanning& planning);
+void XQueryTakePositionRanges(XQueryPlanning& planning);
 void XQueryCompareNames(XQueryPlanning& planning);
 void XQueryKeepInvariants(XQueryPlanning& planning);
 void XQueryCompareEarlierItems(XQueryPlanning& planning);

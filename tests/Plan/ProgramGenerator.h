@@ -38,6 +38,8 @@ class ProgramGenerator {
 
   std::string nodeTest();
   std::string predicate(int depth);
+  // The items from one position to another.
+  std::string range(int depth);
   // A number that may be the same for all items, not be there, or fail.
   std::string computedPosition(int depth);
   std::string nameCondition();

@@ -8,7 +8,9 @@ std::string ProgramGenerator::nodeTest() {
 }
 
 std::string ProgramGenerator::predicate(int depth) {
-  switch (_random.below(11)) {
+  switch (_random.below(12)) {
+    case 11:
+      return "[" + range(depth) + "]";
     case 10:
       return "[" + computedPosition(depth) + "]";
     case 0:
@@ -39,6 +41,21 @@ std::string ProgramGenerator::computedPosition(int depth) {
       _random.oneOf({"count(" + path(depth - 1) + ")", "number(" + variable() + ")", variable(),
                      "xs:integer('u')", "position()", "sum((1, 0.5))"});
   return number + _random.oneOf({" + 1", " - 1", " * 1.5", " + last()", " idiv 0", " mod 3"});
+}
+
+std::string ProgramGenerator::range(int depth) {
+  static const std::vector<std::string> orders = {" <= ", " < ",  " >= ", " > ",
+                                                  " le ", " lt ", " ge ", " gt "};
+  const auto number = [&] {
+    return _random.oneOf({"count(" + path(depth - 1) + ")", "number(" + variable() + ")",
+                          variable(), "xs:integer('u')", "sum((1, 0.5))", "2", "2.5", "()", "-1",
+                          "1e0", "number('u')", "xs:decimal('2.0')", "last()", "(1, 3)",
+                          "string-length(string(" + variable() + "))"});
+  };
+  const std::string own = _random.below(3) ? "position()" + _random.oneOf(orders) + number()
+                                           : number() + _random.oneOf(orders) + "position()";
+  if (_random.below(3)) return own;
+  return own + " and " + (_random.below(4) ? "(" + range(depth) + ")" : comparison(depth - 1));
 }
 
 std::string ProgramGenerator::nameCondition() {

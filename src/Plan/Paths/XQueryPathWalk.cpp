@@ -304,11 +304,23 @@ bool XQueryPathWalk::filterNodes(const XQueryWalkedStep& step, size_t fromIndex,
       nodes.resize(isThere ? 1 : 0);
       continue;
     }
+    if (index == step.range.predicate && keepRange(step.range, nodes)) continue;
     const XQueryNodeQuestion* question =
         step.step->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicates[index].get());
     if (!question) return step.step->filterNodes(nodes, index, context);
     if (!keepNodes(*predicates[index], *question, nodes)) return false;
   }
+  return true;
+}
+
+// False where the predicate has to be asked of each node.
+bool XQueryPathWalk::keepRange(const XQueryPositionRange& range, std::vector<NSXMLNode*>& nodes) {
+  if (nodes.empty()) return true;
+  const auto positions = range.positions(context);
+  if (!positions) return false;
+  nodes.resize(static_cast<size_t>(std::min<uint64_t>(positions->last, nodes.size())));
+  const auto before = std::min<uint64_t>(positions->first - 1, nodes.size());
+  nodes.erase(nodes.begin(), nodes.begin() + static_cast<std::ptrdiff_t>(before));
   return true;
 }
 
@@ -444,6 +456,8 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
     collectComputed(step, axis, node, nodes);
     return first + 1;
   }
+  const bool hasRange = step.range.predicate == first && !listingStep && !step.testMayRaise;
+  if (hasRange && collectRange(step, axis, node, nodes)) return first + 1;
   const bool isFromBack = step.fromBack.predicate == first && axis == XQueryAxisChild;
   if (isFromBack && !listingStep && !step.testMayRaise) {
     collectFromBack(step, node, nodes);
@@ -483,6 +497,24 @@ void XQueryPathWalk::collectComputed(const XQueryWalkedStep& step, int axis, NSX
     return false;
   });
   hasFailed = hasFailed || context._internal().isFailing();
+}
+
+// The same for a range of positions; false where the predicate has to be asked of each node.
+bool XQueryPathWalk::collectRange(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
+                                  std::vector<NSXMLNode*>& nodes) {
+  XQueryStepTest test(step, *this);
+  std::optional<XQueryPositionRange::Positions> positions;
+  bool isOpen = true;
+  uint64_t position = 0;
+  XQueryWalkAnyAxis(node, axis, true, [&](NSXMLNode* found) {
+    if (!test.matches(found)) return true;
+    if (!positions) positions = step.range.positions(context);
+    isOpen = positions.has_value();
+    if (!isOpen || ++position > positions->last) return false;
+    if (position >= positions->first) nodes.push_back(found);
+    return position < positions->last;
+  });
+  return isOpen;
 }
 
 void XQueryPathWalk::collectFromBack(const XQueryWalkedStep& step, const NSXMLNode* node,

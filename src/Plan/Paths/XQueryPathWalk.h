@@ -105,6 +105,8 @@ class XQueryPathWalk : public XQueryPathRun {
                  std::vector<NSXMLNode*>& nodes);
   void collectComputed(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
                        std::vector<NSXMLNode*>& nodes);
+  bool collectRange(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
+                    std::vector<NSXMLNode*>& nodes);
   void collectFromBack(const XQueryWalkedStep& step, const NSXMLNode* node,
                        std::vector<NSXMLNode*>& nodes);
   bool onlyCounts(size_t index, int axis) const;
@@ -112,6 +114,7 @@ class XQueryPathWalk : public XQueryPathRun {
   bool filtersEach(const XQueryWalkedStep& step) const;
   bool keepsAlone(const XQueryWalkedStep& step, size_t firstPredicate, NSXMLNode* node);
   bool filterNodes(const XQueryWalkedStep& step, size_t fromIndex, std::vector<NSXMLNode*>& nodes);
+  bool keepRange(const XQueryPositionRange& range, std::vector<NSXMLNode*>& nodes);
   bool keepNodes(const XQueryExpr& predicate, const XQueryNodeQuestion& question,
                  std::vector<NSXMLNode*>& nodes);
 

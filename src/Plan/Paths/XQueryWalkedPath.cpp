@@ -54,6 +54,23 @@ Value itemFromBack(const Value& items, uint64_t behind) {
   return kept.value();
 }
 
+// As a predicate keeps them that asks for these positions; null where it has to be asked.
+Value itemsInRange(const Value& items, const XQueryPositionRange& range, XQueryContext& context) {
+  const XQueryItemList list(items.get());
+  if (list.count() == 0) return items;
+  const auto positions = range.positions(context);
+  if (!positions) return {};
+  XQueryGatherer kept;
+  WorkPacer pacer;
+  const auto end = static_cast<size_t>(std::min<uint64_t>(positions->last, list.count()));
+  for (uint64_t i = positions->first - 1; i < end; ++i) {
+    pacer.turn();
+    NSObject* item = list[static_cast<size_t>(i)];
+    if (item && item->kind() != Kind::Null) kept.add(item);
+  }
+  return kept.value();
+}
+
 // What deals with each node in the focus that there was before the walk.
 class InFormerFocus final : public XQueryItemGiver::Taker {
  public:
@@ -260,6 +277,13 @@ Value XQueryWalkedPath::evaluateStart(XQueryContext& context,
       items = itemFromBack(items, _startFromBack.behind);
       ++index;
       continue;
+    }
+    if (index == _startRange.predicate) {
+      if (Value inRange = itemsInRange(items, _startRange, context)) {
+        items = std::move(inRange);
+        ++index;
+        continue;
+      }
     }
     const auto* question =
         _start->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicate.get());

@@ -80,6 +80,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   std::vector<XQueryWalkedStep>& changeableSteps() { return _steps; }
   // That of the start.
   XQueryFromBack& startFromBack() { return _startFromBack; }
+  XQueryPositionRange& startRange() { return _startRange; }
   void setFindings(const Findings& findings) {
     _trailCount = findings.trailCount;
     _countsNodes = findings.countsNodes;
@@ -106,6 +107,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   const Ref<XQueryPathExpr> _path;
   const XQueryStep* _start = nullptr;
   XQueryFromBack _startFromBack;
+  XQueryPositionRange _startRange;
   std::vector<XQueryWalkedStep> _steps;
   bool _hasPredicates = false;
   std::unique_ptr<const XQueryPicker> _picker;

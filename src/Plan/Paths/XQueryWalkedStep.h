@@ -5,6 +5,7 @@
 #include "Expr/Paths/XQueryPath.h"
 #include "Expr/Paths/XQueryPathRun.h"
 #include "Plan/Paths/XQueryNameChoice.h"
+#include "Plan/Paths/XQueryPositionRange.h"
 #include "Plan/Paths/XQueryValueLookup.h"
 
 #include <cstddef>
@@ -86,6 +87,8 @@ struct XQueryWalkedStep {
   static constexpr size_t noPredicate = SIZE_MAX;
   size_t computedPosition = noPredicate;
   XQueryFromBack fromBack;
+  // The predicate that keeps the nodes from one position to another.
+  XQueryPositionRange range;
   size_t trail = noTrail;
 };
 
