@@ -9,6 +9,8 @@ constexpr std::array rules = {
     XQueryRule{"paths", "an operator walks it, which further rules know of", XQueryWalkPaths},
     XQueryRule{"name tests", "a filter or a union of names becomes the test of one step",
                XQueryTakeNames},
+    XQueryRule{"paths in paths", "a path that begins with another one goes on from its steps",
+               XQuerySplicePaths},
     XQueryRule{"positions", "a position that is compared with a number is asked for by number",
                XQueryTakePositions},
     XQueryRule{"ranges", "the items from one position to another are taken without asking each",

@@ -50,6 +50,10 @@ class ProgramGenerator {
   // What only asks whether there are nodes, or how many.
   std::string existence(int depth);
   std::string step(int depth);
+  // What a path begins with that goes on behind parentheses.
+  std::string pathInside();
+  // Unions, intersections and differences of paths from the document.
+  std::string setOfPaths(int depth);
   std::string path(int depth);
   std::string comparison(int depth);
   std::string operand(int depth);

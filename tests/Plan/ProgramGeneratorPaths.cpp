@@ -132,8 +132,29 @@ std::string ProgramGenerator::step(int depth) {
   return text;
 }
 
+std::string ProgramGenerator::pathInside() {
+  const std::string inner = _random.oneOf(
+      {"//a", "//b/c", "/a/*", "//a | //b", "//a, //b", "(//a | //c), //b", "//a//b", "//*:a",
+       "/a//c/..", "//@x", "//b[1]", "//a, $x", "(//a)/b", "((//a))", "//*/..", "//a, /a/b", "/"});
+  const bool hasVariable = inner.ends_with("$x");
+  return "(" + (hasVariable ? "//a, " + variable() : inner) + ")";
+}
+
+std::string ProgramGenerator::setOfPaths(int depth) {
+  const auto set = [&] {
+    return _random.oneOf({"//a", "//b", "//a//b", "/a/b", "//b/c", "//*", "//*[self::a or self::c]",
+                          "//a[ancestor::b]", "//b[parent::a]", "//(a | b)", "//@x", "//c/..",
+                          "//a[@x]", "(//a | //b)/c", "/a//*", path(depth - 1)});
+  };
+  static const std::vector<std::string> operators = {" | ", " intersect ", " except ", " union "};
+  std::string text = set() + _random.oneOf(operators) + set();
+  if (_random.below(2)) text = "(" + text + ")" + _random.oneOf(operators) + set();
+  if (_random.below(3) == 0) text = set() + _random.oneOf(operators) + "(" + text + ")";
+  return text;
+}
+
 std::string ProgramGenerator::path(int depth) {
-  std::string text = _random.oneOf({"", "", variable(), variable(), "."});
+  std::string text = _random.oneOf({"", "", variable(), variable(), ".", pathInside()});
   if (text == "." && _random.below(2)) text = "(" + expr(depth - 1) + ")";
   const size_t steps = 1 + _random.below(3);
   for (size_t i = 0; i < steps; ++i) text += step(depth);

@@ -9,6 +9,7 @@
 #include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
+#include <iterator>
 
 namespace xquery {
 namespace {
@@ -119,6 +120,13 @@ XQueryWalkedPath::XQueryWalkedPath(Ref<XQueryExpr> plain, Ref<XQueryPathExpr> pa
     if (!lastAdopting || each.step == lastAdopting) break;
     each.gathersFirst = !each.isExpression();
   }
+}
+
+void XQueryWalkedPath::takeSteps(XQueryWalkedPath& of) {
+  _start = of._start;
+  _steps.insert(_steps.begin(), std::make_move_iterator(of._steps.begin()),
+                std::make_move_iterator(of._steps.end()));
+  of._steps.clear();
 }
 
 const XQueryWalkedStep* XQueryWalkedPath::walked(const XQueryStep& asWritten) const {

@@ -78,6 +78,8 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
     bool findsInOrder = false;
   };
   std::vector<XQueryWalkedStep>& changeableSteps() { return _steps; }
+  // Puts the steps of another path, which this one begins with, before its own.
+  void takeSteps(XQueryWalkedPath& of);
   // That of the start.
   XQueryFromBack& startFromBack() { return _startFromBack; }
   XQueryPositionRange& startRange() { return _startRange; }

@@ -4,7 +4,7 @@
 //             *[string(node-name(.)) = "a"], *[string(namespace-uri()) = "u" and ...],
 //             node()[. instance of element(a)] where that is the first predicate of the step; *:a,
 //             p:*; P/(a | b), P//(a | b), P/(@a | @b), P/(parent::a | parent::b);
-//             //a | //b, /r/a | /r/b
+//             //a | //b, /r/a | /r/b, (//a, //b)/c
 // Facts       the test before the filter looks at kinds of nodes alone; the names can be resolved
 //             without an error; no expression behind it asks for the position that a node has
 //             among the others; nothing shows the focus that it leaves (StepsAround.h)
@@ -23,6 +23,7 @@
 #include "Plan/Rules.h"
 #include "Plan/Rules/NameConditions.h"
 #include "Plan/Rules/PathAt.h"
+#include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/StepsAround.h"
 
 #include <vector>
@@ -197,7 +198,7 @@ class Search {
     for (XQueryPlaceID place = 0; place < _planning.program.placeCount(); ++place) {
       if (!_planning.isOpen(place)) continue;
       const XQueryExpr& expr = *_planning.program[place].expr;
-      if (isUnion(expr)) {
+      if (isUnion(expr) || beginsPath(place)) {
         takeUnionOfPaths(place);
       } else if (isa<XQueryPathExpr>(&expr)) {
         if (XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, place)) lookAt(place, *path);
@@ -271,6 +272,24 @@ class Search {
     _planning.refuse(place, "an error that comes up later may show the focus that it leaves");
   }
 
+  // Whether it is a list with whose nodes a path begins that goes on along axes alone, so that the
+  // order and the repetition of nodes make no difference.
+  bool beginsPath(XQueryPlaceID place) const {
+    const XQueryPlace& here = _planning.program[place];
+    const auto* list = dyn_cast<XQueryExprList>(here.expr);
+    if (!list || list->count() < 2 || list->kind() != Kind::ExprList) return false;
+    const XQueryPlaceID around = XQueryPlaceAround(_planning.program, place);
+    const XQueryStep* first = _planning.program[around].step;
+    if (_planning.program[around].role != XQueryRole::FirstStep || !first) return false;
+    bool areOfAxes = first->next() && first->predicates().empty();
+    for (const XQueryStep* step = first->next(); step; step = step->next()) {
+      const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
+      // An error would leave the focus on the node that comes first.
+      areOfAxes = areOfAxes && axisStep && !axisStep->testMayRaise() && !step->mayAdopt();
+    }
+    return areOfAxes;
+  }
+
   // The first path takes the names of the others.
   void takeUnionOfPaths(XQueryPlaceID place) {
     if (!_planning.program[place].isOrdered) return;
@@ -284,7 +303,12 @@ class Search {
       names.addTest(By::Test, testOf(*name));
       return true;
     };
-    if (!forEachOperand(_planning.program[place].expr, isUnion, add)) return;
+    const XQueryExpr* expr = _planning.program[place].expr;
+    const auto* list = dyn_cast<XQueryExprList>(expr);
+    for (size_t index = 0; list && index < list->count(); ++index) {
+      if (index > mostNames || !forEachOperand(list->objectAtIndex(index), isUnion, add)) return;
+    }
+    if (!list && !forEachOperand(expr, isUnion, add)) return;
     auto by = XQueryWalkedPath::exprWithPlain(
         _planning.exprAt(place), Ref<XQueryPathExpr>(const_cast<XQueryPathExpr*>(first)));
     by->changeableSteps().back().becomeAxisStep(XQueryAxisChild, std::move(names));
