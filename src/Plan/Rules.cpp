@@ -29,6 +29,8 @@ constexpr std::array rules = {
                XQueryCompareEarlierItems},
     XQueryRule{"sets", "the items of a long side of a comparison are found by their values",
                XQueryCompareWithSets},
+    XQueryRule{"set counts", "the nodes of sets are counted by the names on the way to them",
+               XQueryCountSets},
     XQueryRule{"counts", "items are counted, or found to be there, without a list of them",
                XQueryCountPaths},
     XQueryRule{"first", "no more is walked or sorted than the first items that are asked for",

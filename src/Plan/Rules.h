@@ -37,6 +37,7 @@ void XQueryJoinForClauses(XQueryPlanning& planning);
 void XQueryJoinQuantifiers(XQueryPlanning& planning);
 void XQueryJoinSteps(XQueryPlanning& planning);
 void XQueryCountLists(XQueryPlanning& planning);
+void XQueryCountSets(XQueryPlanning& planning);
 void XQueryCountPaths(XQueryPlanning& planning);
 void XQueryTakeFirst(XQueryPlanning& planning);
 void XQueryTakeOneByOne(XQueryPlanning& planning);

@@ -103,7 +103,8 @@ std::string ProgramGenerator::nearbyNode() {
 }
 
 std::string ProgramGenerator::existence(int depth) {
-  const std::string nodes = _random.below(3) ? "." + step(depth) : path(depth);
+  std::string nodes = _random.below(3) ? "." + step(depth) : path(depth);
+  if (depth > 0 && _random.below(4) == 0) nodes = "(" + setOfPaths(depth) + ")";
   switch (_random.below(4)) {
     case 0:
       return nodes;

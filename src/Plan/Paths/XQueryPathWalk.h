@@ -44,9 +44,11 @@
 #include "Expr/Paths/XQueryPathRun.h"
 #include "Plan/Paths/XQueryAxisTrail.h"
 #include "Plan/Paths/XQueryWalkedStep.h"
+#include "Platform/Tree/NameIndex.h"
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <vector>
 
@@ -82,6 +84,9 @@ class XQueryPathWalk : public XQueryPathRun {
   // The whole path from one node, where that is a document whose index knows what the first steps
   // find; false for: walk.
   bool takeAlongWays(const Value& start);
+  // On which ways all that it finds from the document lies, and nothing else; none where the index
+  // does not tell.
+  std::optional<NSXMLNameIndex::Ways> waysFrom(const NSXMLNameIndex& elements);
   // Afterwards, so that the index is made when that has been asked often enough.
   void noteMet() const;
 

@@ -125,6 +125,16 @@ bool XQueryPathWalk::takeAlongWays(const Value& start) {
   return false;
 }
 
+std::optional<NSXMLNameIndex::Ways> XQueryPathWalk::waysFrom(const NSXMLNameIndex& elements) {
+  const Ways ways(*this);
+  const size_t all = ways.count();
+  if (all == 0 || ways.stepsDone(all) != _steps.size() || !ways.areAllAnswered()) {
+    return std::nullopt;
+  }
+  if (ways.mayFindInstructions() && elements.hasInstructions()) return std::nullopt;
+  return elements.along(ways.first(all));
+}
+
 void XQueryPathWalk::noteMet() const {
   if (_notesMetOf) NSXMLNoteWalked(_met, _notesMetOf);
 }

@@ -191,6 +191,24 @@ std::optional<uint64_t> XQueryWalkedPath::countItems(uint64_t most, XQueryContex
   return std::min(number.value_or(XQueryItemList(items.get()).count()), most);
 }
 
+std::optional<NSXMLNameIndex::Ways> XQueryWalkedPath::waysFrom(const NSXMLNameIndex& elements,
+                                                               XQueryContext& context) const {
+  auto& dynamic = context._internal();
+  const int64_t position = dynamic.position();
+  const int64_t last = dynamic.last();
+  Value contextItem = dynamic.contextItem();
+  XQueryPathResults results;
+  results.countOnly();
+  XQueryPathWalk walk(_steps, _trailCount, results, context);
+  walk.setsEveryFocus = false;
+  walk.startsFromOne = true;
+  walk.orderIsFree = true;
+  auto ways = walk.waysFrom(elements);
+  dynamic.setContextItem(std::move(contextItem), position);
+  dynamic.setLast(last);
+  return walk.hasFailed ? std::nullopt : std::move(ways);
+}
+
 Value XQueryWalkedPath::firstItems(uint64_t most, XQueryContext& context) const {
   XQueryCheckStack(context);
   XQueryPathResults results;

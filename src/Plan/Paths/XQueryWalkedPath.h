@@ -53,6 +53,11 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   // after an error. For a path that findsInOrder.
   Value firstItems(uint64_t most, XQueryContext& context) const;
 
+  // On which ways of the index all that it finds from the document lies, and nothing else; none
+  // where that cannot be told. For a path from the document that countsNodes.
+  std::optional<NSXMLNameIndex::Ways> waysFrom(const NSXMLNameIndex& elements,
+                                               XQueryContext& context) const;
+
   // Hands on one node after another as the walk finds them, until the taker wants no more of them;
   // the items of the value where they do not come in its order. False after an error, that of the
   // taker as well. For a path that findsInOrder.

@@ -271,6 +271,14 @@ std::optional<uint64_t> NSXMLNameIndex::countAlong(std::span<const NSXMLWayStep>
   return _ways.empty() ? std::nullopt : std::optional(countOn(waysAlong(steps)));
 }
 
+std::optional<NSXMLNameIndex::Ways> NSXMLNameIndex::along(
+    std::span<const NSXMLWayStep> steps) const {
+  if (_ways.empty()) return std::nullopt;
+  Ways ways = waysAlong(steps);
+  std::sort(ways.begin(), ways.end());
+  return ways;
+}
+
 std::optional<NSXMLNodeSpan> NSXMLNameIndex::nodesAlong(std::span<const NSXMLWayStep> steps) const {
   if (_ways.empty() || steps.empty() || !steps.back().name) return std::nullopt;
   const NSXMLNodeSpan all = nodes(steps.back().name);

@@ -76,6 +76,10 @@ class NSXMLNameIndex {
   // How many elements the steps find from the document at the root, each counted once; none where
   // the ways are not known.
   std::optional<uint64_t> countAlong(std::span<const NSXMLWayStep> steps) const;
+  // On which ways these lie, by numbers in ascending order; and how many elements lie on some ways.
+  using Ways = NSXMLIndexList<uint32_t>;
+  std::optional<Ways> along(std::span<const NSXMLWayStep> steps) const;
+  uint64_t countOn(const Ways& ways) const;
   // These, where the last step asks for a name, all of whose elements they are.
   std::optional<NSXMLNodeSpan> nodesAlong(std::span<const NSXMLWayStep> steps) const;
   // Whether the tree of an index of elements has processing instructions, which have names too.
@@ -103,11 +107,9 @@ class NSXMLNameIndex {
     uint32_t below = 0;  // the last one of those that are longer by a name; 0 for none
     uint32_t next = 0;   // another one of the same length
   };
-  using Ways = NSXMLIndexList<uint32_t>;
   void addBelow(uint32_t way, const NSXMLWayStep& step, Ways& found) const;
   uint32_t behind(uint32_t way, uint32_t top, bool isDeep) const;
   Ways waysAlong(std::span<const NSXMLWayStep> steps) const;
-  uint64_t countOn(const Ways& ways) const;
 
   // The list of nodes and that of their ways, and the result.
   static constexpr size_t bytesPerNode = 2 * sizeof(NSXMLNodePlace) + sizeof(uint32_t);
