@@ -31,6 +31,8 @@ constexpr std::array rules = {
                XQueryCompareWithSets},
     XQueryRule{"set counts", "the nodes of sets are counted by the names on the way to them",
                XQueryCountSets},
+    XQueryRule{"loop counts", "what loops over paths find is counted as what one path finds",
+               XQueryCountLoops},
     XQueryRule{"counts", "items are counted, or found to be there, without a list of them",
                XQueryCountPaths},
     XQueryRule{"first", "no more is walked or sorted than the first items that are asked for",

@@ -38,6 +38,7 @@ void XQueryJoinQuantifiers(XQueryPlanning& planning);
 void XQueryJoinSteps(XQueryPlanning& planning);
 void XQueryCountLists(XQueryPlanning& planning);
 void XQueryCountSets(XQueryPlanning& planning);
+void XQueryCountLoops(XQueryPlanning& planning);
 void XQueryCountPaths(XQueryPlanning& planning);
 void XQueryTakeFirst(XQueryPlanning& planning);
 void XQueryTakeOneByOne(XQueryPlanning& planning);
