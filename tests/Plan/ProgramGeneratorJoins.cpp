@@ -96,7 +96,9 @@ std::string ProgramGenerator::joined(int depth) {
                 [&] {
                   const std::string clause =
                       _random.oneOf({"let $v := " + keyOf("$u"), "for $v in " + keyOf("$u"),
-                                     "for $v in " + many(), "for $v at $n in " + many()});
+                                     "for $v in " + many(), "for $v at $n in " + many(),
+                                     "for $v in " + many() + "[" + match(".") + "]",
+                                     "for $v in //b[" + match(".") + "]"});
                   return clause + within("$v", [&] {
                            std::string rest = " where " + matches(_random.oneOf({"$u", "$v"}));
                            return rest + " return " + (_random.below(2) ? "$v" : expr(depth - 1));

@@ -3,7 +3,8 @@
 // Pattern     a step with predicates, one of which is K = P, or joins it to others by "and", with
 //             the comparisons of a where clause; K reads the context item and P does not. It is the
 //             first step, or an axis step with nothing but axis steps before it, the first one
-//             apart
+//             apart. Where a "for" walks what the last step finds, equalities of the where clause
+//             behind it pick as well (XQueryTermsBehind.h)
 // Facts       all predicates are repeatable, read neither position nor size and answer no number:
 //             then they can be asked in any order, and an error in one drops the item as well; the
 //             steps before it are repeatable and read no variables
@@ -14,6 +15,7 @@
 //             once, in an order that does not depend on how it was found
 #include "Plan/Joins/XQueryJoin.h"
 #include "Plan/Joins/XQueryJoinedSteps.h"
+#include "Plan/Joins/XQueryTermsBehind.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 #include "Plan/Rules/PathAt.h"
@@ -49,6 +51,7 @@ void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryWalkedPath& p
   if (const XQueryStep* start = path.start()) {
     auto condition = conditionOf(planning, XQueryPredicatesOf(planning, place, *start, 0));
     if (!condition.terms.empty()) {
+      if (path.steps().empty()) XQueryAddTermsBehind(planning, place, condition);
       planning.choose(place);
       return path.setPicker(XQueryJoin::ofStep(path, std::move(condition), false), start);
     }
@@ -64,6 +67,7 @@ void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryWalkedPath& p
     const XQueryFacts facts = XQueryFactsUpTo(planning, place, path, steps[i]);
     if (!isSettled(facts)) return;
     const bool looksAround = facts.does(XQueryDeeds::ReadsOutside);
+    if (i + 1 == steps.size()) XQueryAddTermsBehind(planning, place, condition);
     planning.choose(place);
     return path.setPicker(XQueryJoin::ofStep(path, std::move(condition), looksAround),
                           steps[i].step);
