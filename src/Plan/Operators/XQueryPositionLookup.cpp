@@ -122,6 +122,8 @@ Value XQueryPositionLookup::computeValue(XQueryContext& context) const {
   if (!table) return plain().evaluateWithContext(context);
   const Value wanted = normalised(_wanted->evaluateWithContext(context));
   if (XQueryHasFailed(wanted, context)) return {};
+  // What is looked for is not atomized, and the items are no nodes then.
+  if (wanted && wanted->isNode()) return NSNull::null();
   const bool isKnown =
       wanted && (isa<NSString>(wanted) || isa<NSNumber>(wanted)) && !isNaN(*wanted);
   if (!isKnown) return plain().evaluateWithContext(context);
