@@ -284,17 +284,30 @@ std::string_view viewOf(ctmbstr text) {
   return text ? std::string_view(text) : std::string_view();
 }
 
+bool isElement(TidyNode node) {
+  const TidyNodeType type = tidyNodeGetType(node);
+  return type == TidyNode_Start || type == TidyNode_StartEnd;
+}
+
+// An end tag that ends nothing may be a child as well.
+bool hasElement(TidyNode parent, std::string_view name) {
+  TidyNode child = tidyGetChild(parent);
+  while (child && !(isElement(child) && viewOf(tidyNodeGetName(child)) == name)) {
+    child = tidyGetNext(child);
+  }
+  return child != nullptr;
+}
+
 // The html element, and the comments beside it.
 void Writer::write() {
-  bool hasElement = false;
+  bool hasRoot = false;
   TidyNode node = tidyGetChild(tidyGetRoot(_document));
   while (node) {
-    const TidyNodeType type = tidyNodeGetType(node);
-    const bool isElement = type == TidyNode_Start || type == TidyNode_StartEnd;
     const bool isTopLevel = tidyNodeGetType(tidyGetParent(node)) == TidyNode_Root;
-    const bool isSkipped = isTopLevel && (isElement ? hasElement : type != TidyNode_Comment);
+    const bool isSkipped =
+        isTopLevel && (isElement(node) ? hasRoot : tidyNodeGetType(node) != TidyNode_Comment);
     const bool isOpen = !isSkipped && open(node);
-    hasElement = hasElement || isElement;
+    hasRoot = hasRoot || isElement(node);
     if (isOpen && tidyGetChild(node)) {
       node = tidyGetChild(node);
       continue;
@@ -333,7 +346,8 @@ void Writer::openElement(TidyNode node) {
   const std::string_view name = viewOf(tidyNodeGetName(node));
   _out += '<';
   elementName(name);
-  if (tidyNodeGetType(tidyGetParent(node)) == TidyNode_Root) {
+  const bool isTopLevel = tidyNodeGetType(tidyGetParent(node)) == TidyNode_Root;
+  if (isTopLevel) {
     _out.append(" xmlns=\"").append(XHTML).append("\"");
   }
   for (const Foreign& foreign : foreignNamespaces) {
@@ -342,9 +356,15 @@ void Writer::openElement(TidyNode node) {
   _attributes.clear();
   for (TidyAttr each = tidyAttrFirst(node); each; each = tidyAttrNext(each)) attribute(each);
   _out += '>';
+  // The library adds none where one is ended before it begins.
+  if (isTopLevel && !hasElement(node, "head")) _out += "<head><title></title></head>";
 }
 
 void Writer::close(TidyNode node) {
+  const bool isTopLevel = tidyNodeGetType(tidyGetParent(node)) == TidyNode_Root;
+  if (isTopLevel && !hasElement(node, "body") && !hasElement(node, "frameset")) {
+    _out += "<body></body>";
+  }
   _out += "</";
   elementName(viewOf(tidyNodeGetName(node)));
   _out += '>';

@@ -47,6 +47,11 @@ TEST(Tidy, AddsWhatIsMissing) {
   EXPECT_EQ(body("<table><td>1<td>2</table>"), "<table><tr><td>1</td><td>2</td></tr></table>");
 }
 
+TEST(Tidy, AddsAHeadThatIsEndedBeforeItBegins) {
+  EXPECT_EQ(body("<html></head><p>a"), "<p>a</p>");
+  EXPECT_EQ(converted("<html></head>"), std::string(head) + std::string(tail));
+}
+
 TEST(Tidy, PutsCrossedTagsInOrder) {
   EXPECT_EQ(body("<p><b>x<i>y</b>z</i></p>"), "<p><b>x<i>y</i></b><i>z</i></p>");
 }
