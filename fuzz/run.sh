@@ -1,8 +1,10 @@
 #!/usr/bin/env bash
-# run.sh MINUTES [TARGET...]: builds the fuzz targets, all unless some are named, into build/fuzz and
-# runs one after another, each for its share of the time (fractions are allowed). What makes one fail
-# is kept under build/fuzz/found/TARGET, what it has learnt under build/fuzz/corpus/TARGET for the
-# next run. The status is 1 when something was found: mend it, and keep its smallest form as a seed.
+# run.sh MINUTES [TARGET...]: builds all fuzz targets into build/fuzz and runs one after another,
+# those named or all, each for so many minutes (fractions are allowed). XQUERY_FUZZ_JOBS says how many
+# of them run at a time, one unless given. What makes one fail is kept under
+# build/fuzz/found/TARGET, what it has learnt under build/fuzz/corpus/TARGET for the next run;
+# XQUERY_FUZZ_CORPUS names another folder for that. The status is 1 when something was found: mend it,
+# and keep its smallest form as a seed.
 set -u
 . "$(dirname "${BASH_SOURCE[0]}")/../cmake/prepare.sh"
 
@@ -11,29 +13,41 @@ shift
 need_packages "${packages[@]}" clang libclang-rt-dev || exit 1
 
 cd "$top/fuzz" || exit 1
-targets=(*.cpp)
+targets=("$@")
+[ ${#targets[@]} -gt 0 ] || targets=(*.cpp)
 targets=("${targets[@]%.cpp}")
-[ $# -gt 0 ] && targets=("$@")
-(build fuzz -DXQUERY_WERROR="${XQUERY_WERROR:-OFF}" -- "${targets[@]/#/fuzz_}") || exit 1
-seconds=$(awk -v minutes="$minutes" -v count="${#targets[@]}" \
-  'BEGIN { share = int(minutes * 60 / count); print (share > 1 ? share : 1) }')
-status=0
-for target in "${targets[@]}"; do
-  out=$top/build/fuzz
-  found=$out/found/$target
-  corpus=$out/corpus/$target
-  mkdir -p "$found" "$corpus"
-  options=(-max_total_time="$seconds" -timeout=20 -rss_limit_mb=2048 -artifact_prefix="$found/"
-    -print_final_stats=1)
+seconds=$(awk -v minutes="$minutes" 'BEGIN { all = int(minutes * 60); print (all > 1 ? all : 1) }')
+out=$top/build/fuzz
+results=$(mktemp -d)
+trap 'rm -rf "$results"' EXIT
+
+# run_target TARGET: leaves a file in the folder of results when it finds something.
+run_target() {
+  local target=$1
+  local found=$out/found/$target corpus=${XQUERY_FUZZ_CORPUS:-$out/corpus}/$target
+  local log=$out/$target.log
+  mkdir -p "$found" "$corpus" "seeds/$target"
+  local options=(-max_total_time="$seconds" -timeout=30 -rss_limit_mb=3000 -print_final_stats=1
+    -artifact_prefix="$found/")
   [ -f "dictionaries/$target.txt" ] && options+=(-dict="dictionaries/$target.txt")
-  echo "== $target, for $seconds s"
-  log=$out/$target.log
   if "$out/fuzz_$target" "${options[@]}" "$corpus" "seeds/$target" >"$log" 2>&1; then
-    grep -E 'stat::number_of_executed_units' "$log"
+    echo "== $target, for $seconds s: $(awk '/number_of_executed_units/ { print $2 }' "$log") inputs"
   else
+    echo "== $target, for $seconds s: found something"
     tail -40 "$log"
-    echo "$target failed; what it failed on is in $found"
-    status=1
+    touch "$results/$target"
   fi
+}
+
+for target in "${targets[@]}"; do
+  while [ "$(jobs -rp | wc -l)" -ge "${XQUERY_FUZZ_JOBS:-1}" ]; do wait -n; done
+  run_target "$target" &
 done
-exit $status
+wait
+
+failed=$(ls "$results")
+[ -z "$failed" ] && exit 0
+for target in $failed; do
+  echo "$target failed; what it failed on is in $out/found/$target"
+done
+exit 1

@@ -1,11 +1,10 @@
 // Programs, places and facts as texts.
 #pragma once
 
-#include "Context/XQueryContextInternal.h"
-#include "Engine/ErrorPlaceText.h"
 #include "Engine/XQueryInternal.h"
 #include "Plan/FactsAnalysis.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
+#include "Plan/Outcome.h"
 #include "Plan/Program.h"
 #include "Plan/Report.h"
 #include "Prolog/XQueryProlog.h"
@@ -16,7 +15,6 @@
 #include <array>
 #include <string>
 #include <string_view>
-#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -124,53 +122,6 @@ inline Value document(std::string_view xml) {
   Value parsed = NSXMLDocument::documentWithData(xml, NSXMLNodePreserveWhitespace, &failure);
   EXPECT_TRUE(parsed) << failure.message;
   return parsed;
-}
-
-// The outcome of one evaluation, told in full: the items with their types, which of them are the
-// same object, the error with its number, line and text, and the focus that is left.
-struct Outcome {
-  std::vector<std::string> lines;
-  bool operator==(const Outcome&) const = default;
-};
-
-inline std::string shownItem(const NSObject& item) {
-  std::string text = XQueryItemTypeName(item) + " ";
-  if (const auto* node = dyn_cast<NSXMLNode>(&item)) {
-    node->appendXMLTo(text);
-  } else {
-    text += XQueryItemStringValue(item);
-  }
-  return text;
-}
-
-inline Outcome outcomeOf(const XQuery& query, const Value& contextItem,
-                         const XQueryConstants& constants = {}, const XQueryLimits& limits = {}) {
-  Outcome outcome;
-  const auto context = XQueryContext::xqueryContext();
-  context->contextSetLimits(limits);
-  Ref<XQueryError> error;
-  const auto items = context->evaluateXQuery(query, constants, contextItem, &error);
-  if (error) {
-    outcome.lines.push_back("error " + std::to_string(error->err()) + " line " +
-                            std::to_string(error->line()) + " " +
-                            (error->msg() ? error->msg()->utf8() : ""));
-    outcome.lines.push_back(placeText(*error));
-  }
-  if (items) {
-    std::unordered_map<const NSObject*, size_t> places;
-    for (const Value& item : items->objects()) {
-      const auto [first, isNew] = places.try_emplace(item.get(), outcome.lines.size());
-      std::string line = shownItem(*item);
-      if (!isNew) line += " as " + std::to_string(first->second);
-      outcome.lines.push_back(std::move(line));
-    }
-  }
-  const auto& left = context->_internal();
-  if (left.contextItem()) {
-    outcome.lines.push_back("left " + shownItem(*left.contextItem()) + " at " +
-                            std::to_string(left.position()) + " of " + std::to_string(left.last()));
-  }
-  return outcome;
 }
 
 // Both ways agree. Answers what they come to.

@@ -1,0 +1,153 @@
+// Casts and lexical forms. The first byte chooses a type, the rest is a text. What the text is as a
+// value of that type prints in a form that is read back as itself; "castable" says what "cast"
+// does, to every type and from every type; and none of it depends on the plan.
+#include "support/Failure.h"
+#include "support/Input.h"
+#include "support/QueryWords.h"
+#include "xquery/xquery.h"
+
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+using namespace xquery;
+using namespace xquery::fuzz;
+
+extern "C" int LLVMFuzzerInitialize(int*, char***) {
+  ::setenv("TZ", "Europe/Berlin", 1);
+  return 0;
+}
+
+namespace {
+
+struct Outcome {
+  Value value;  // null after an error
+  std::string text;
+  bool isCastable = false;
+
+  bool isValue() const { return value != nullptr; }
+};
+
+// A program for each type: whether $v is castable, and what it is cast.
+struct Casts {
+  explicit Casts(std::string_view type)
+      : castable(compiled("$v castable as ", type, XQueryWay::Plain)),
+        plain(compiled("$v cast as ", type, XQueryWay::Plain)),
+        planned(compiled("$v cast as ", type, XQueryWay::Planned)) {}
+
+  static Ref<XQuery> compiled(std::string_view operation, std::string_view type, XQueryWay way) {
+    const std::string text =
+        "declare variable $v external; " + std::string(operation) + std::string(type);
+    return XQuery::xqueryWithSource(text, XQueryLoading(), XQueryLimits(), way);
+  }
+
+  Ref<XQuery> castable;
+  Ref<XQuery> plain;
+  Ref<XQuery> planned;
+};
+
+const std::vector<Casts>& casts() {
+  static const std::vector<Casts> all(atomicTypes().begin(), atomicTypes().end());
+  return all;
+}
+
+Value evaluated(const XQuery& query, const Value& value, std::string& error) {
+  const auto context = XQueryContext::xqueryContext();
+  Ref<XQueryError> failure;
+  const auto items = context->evaluateXQuery(query, {{"v", value}}, {}, &failure);
+  check(items || failure, "neither a value nor an error");
+  const auto found = XQueryFirstError(items, failure);
+  if (found) {
+    error = found->description()->utf8();
+    return nullptr;
+  }
+  check(items->count() == 1, "a cast to many items");
+  return items->objectAtIndex(0);
+}
+
+std::string textOf(const Value& value, const std::string& error) {
+  return value ? XQueryItemTypeName(*value) + " " + XQueryItemStringValue(*value) : error;
+}
+
+// What the value shows of itself depends on the type alone that it has.
+bool isSpecialNumber(const Value& value) {
+  const std::string text = value ? XQueryItemStringValue(*value) : "";
+  return text == "INF" || text == "-INF" || text == "NaN";
+}
+
+Outcome castTo(size_t type, const Value& value) {
+  const Casts& programs = casts()[type];
+  Outcome outcome;
+  std::string error;
+  outcome.value = evaluated(*programs.plain, value, error);
+  outcome.text = textOf(outcome.value, error);
+  std::string otherError;
+  const Value planned = evaluated(*programs.planned, value, otherError);
+  checkEqual(textOf(planned, otherError), outcome.text, "a cast that depends on the plan");
+  const Value castable = evaluated(*programs.castable, value, error);
+  check(castable != nullptr, "castable fails", error);
+  outcome.isCastable = cast<NSNumber>(castable)->boolValue();
+  return outcome;
+}
+
+// The infinities of xs:float are those of xs:double, and so of another type; and a URI that cannot
+// be cast answers an error that is not raised.
+void checkCastable(size_t type, const Outcome& outcome, std::string_view from) {
+  const std::string_view name = atomicTypes()[type];
+  if ((name == "xs:float" && isSpecialNumber(outcome.value)) || from == "xs:anyURI") return;
+  check(outcome.isCastable == outcome.isValue(),
+        std::string(name) +
+            (outcome.isCastable ? ": castable but not cast" : ": cast but not castable"),
+        std::string(from) + "\n" + outcome.text);
+}
+
+// Fractions of seconds print with six digits, the first of which are taken for less when they are
+// zeros of a duration: such forms are read as another value.
+bool mayChange(std::string_view name, std::string_view form) {
+  if (form.find('.') == form.npos) return false;
+  return name.ends_with("ration") || name.ends_with("ime");
+}
+
+// The types after integer count as derived from all those before them in the table of types, so
+// that a value of one of them is cast to another one unchanged, whatever its sign.
+bool isKeptUnchanged(std::string_view from, std::string_view to) {
+  const auto isIntegral = [](std::string_view name) {
+    return name.ends_with("nteger") || name.ends_with("ong") || name.ends_with("nt") ||
+           name.ends_with("hort") || name.ends_with("yte");
+  };
+  return isIntegral(from) && isIntegral(to);
+}
+
+void checkForm(size_t type, const Value& value) {
+  const std::string_view name = atomicTypes()[type];
+  const std::string form = XQueryItemStringValue(*value);
+  const bool isReadFromString = name == "xs:NOTATION" || name == "xs:QName";
+  // What is cut off decides the sign: 0.5 is a positive integer, and prints as 0.
+  const bool isCutOff =
+      form == "0" && (name == "xs:positiveInteger" || name == "xs:negativeInteger");
+  if (mayChange(name, form) || isReadFromString || isCutOff) return;
+  const Outcome again = castTo(type, XQueryUntypedAtomic(form));
+  check(again.isValue(), std::string(name) + ": a form that is none of the type", form);
+  checkEqual(XQueryItemStringValue(*again.value), form, "read back otherwise");
+}
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+  Input input(data, size);
+  const size_t type = input.below(casts().size());
+  const std::string_view rest = input.rest();
+  const Value text = NSString::stringWithUTF8Replacing(rest);
+  const Outcome source = castTo(type, text);
+  checkCastable(type, source, "xdt:untypedAtomic");
+  if (!source.isValue()) return 0;
+  checkForm(type, source.value);
+  for (size_t target = 0; target < casts().size(); ++target) {
+    const Outcome outcome = castTo(target, source.value);
+    checkCastable(target, outcome, atomicTypes()[type]);
+    if (outcome.isValue() && !isKeptUnchanged(atomicTypes()[type], atomicTypes()[target])) {
+      checkForm(target, outcome.value);
+    }
+  }
+  return 0;
+}
