@@ -335,15 +335,14 @@ class Analysis {
 
   // --- constructors ----------------------------------------------------------------------------
 
-  // What it takes in are copies of nodes.
+  // What it takes in are copies of nodes with what is below them, and with the namespaces in scope:
+  // whatever is above a node is there with those it declares. Of what is around the node a copy
+  // shows nothing, nor is one a node of the document.
   Sources element(XQueryPlaceID place, const Sources& focus) {
     forEachPart(place, [&](XQueryPlaceID part) {
-      const Sources sources = visit(part, focus);
       const bool isContent = _program[part].role == XQueryRole::Content;
-      if (isContent && (!sources.places().empty() || sources.hasInner)) {
-        refuse(part, "nodes of the document are copied");
-      }
-      need(sources, XMLProjection::StringValue, part);
+      need(visit(part, focus), isContent ? XMLProjection::AllBelow : XMLProjection::StringValue,
+           part);
     });
     return {};
   }

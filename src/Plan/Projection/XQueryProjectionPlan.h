@@ -8,7 +8,7 @@
 // The rule is one of permission: each class of expressions, each axis and each built-in function
 // that may meet nodes of the document is listed here or has a column in the registry. Anything else
 // that meets one needs the whole document: steps sideways and upwards, comparisons of order, nodes
-// that are given to functions, typeswitch, constructors and the like.
+// that are given to functions, typeswitch and the like.
 //
 // Positions are no matter: they are counted among the nodes that a step finds, and of these all are
 // there. Nor is what else there is: more than what is asked for is never found by a step. The

@@ -91,7 +91,7 @@ class Questions {
   explicit Questions(unsigned seed) : _random(seed) {}
 
   std::string question() {
-    switch (_random.below(8)) {
+    switch (_random.below(11)) {
       case 0:
         return "for $n in " + path() + " where " + condition("$n") + " return " +
                use("$n" + tail());
@@ -106,6 +106,13 @@ class Questions {
         return "<r n='{" + use(path()) + "}'>{" + path() + "/text()}</r>";
       case 5:
         return "for $n in " + path() + " order by string($n" + tail() + ") return " + use("$n");
+      case 6:
+        return "<r n='{" + use(path()) + "}'>{" + path() + "}</r>" + aroundCopies();
+      case 7:
+        return "for $n in " + path() + " return <e>{$n" + tail() + ", $n/@y}</e>" + aroundCopies();
+      case 8:
+        return "let $d := document {" + path() + ", <s>{" + path() + "}</s>} return $d" +
+               aroundCopies();
       default:
         return use(path());
     }
@@ -133,6 +140,11 @@ class Questions {
   std::string tail() {
     return _random.oneOf(
         {"", "/@x", "/text()", "/b", "/*", "/self::a", "/@*", "/string()", "/node()", "/c/b"});
+  }
+  // What is in a new tree can be looked at from all sides.
+  std::string aroundCopies() {
+    return _random.oneOf({"", "", "/*", "//b", "//c/..", "/*/following-sibling::node()",
+                          "/descendant::node()", "/*[last()]/preceding::*/@x", "//a//b", "/@*"});
   }
   std::string condition(const std::string& node) {
     return _random.oneOf({node + "/@x = 1", "exists(" + node + "/b)", node + " = 'u'",
@@ -162,6 +174,35 @@ TEST(ProjectedPrograms, QuestionsThatNeedLittleAnswerTheSame) {
     if (HasFailure()) break;
   }
   EXPECT_GT(needsLess * 2, count);
+}
+
+// A copy keeps what is in scope where its node stands, and shows nothing else that is around it.
+TEST(ProjectedPrograms, CopiesKeepWhatIsInScope) {
+  constexpr std::string_view document =
+      "<r xmlns='urn:d' xmlns:p='urn:p' xml:lang='en' xml:base='http://base/'>t"
+      "<a xmlns:q='urn:q' x='1'>u<s><p:n q:y='2'>v<q:m xmlns:p='urn:other' p:z='3'/></p:n></s></a>"
+      "<b xmlns=''><n xml:space='preserve'> <o/> </n><!--c--><n/></b>"
+      "<a xml:base='inner/'><?i j?><n>w</n>k</a></r>";
+  const char* const queries[] = {
+      "<e>{//*:n}</e>",
+      "<e xmlns:p='urn:mine'>{//*:n}</e>",
+      "for $n in //*:n return <e>{$n}</e>",
+      "for $n in //*:n return <e>{$n}</e>/*/*",
+      "<e>{/*/*:a/*:n}</e>/*",
+      "<e>{//*:m}</e>//@*",
+      "document {//*:n}/*/../node()",
+      "<e>{/*/*:b/n, /*/*:a/@x}</e>",
+      "<e>{//*:n}</e>/*:n/following-sibling::*",
+      "<e>{//*:n/text()}</e>",
+      "let $e := <e>{//*:a}</e> return ($e//*:n/.., count($e//text()), $e/*[last()]/node())",
+      "element {name(//*:m)} {//*:b}",
+      "for $a in /*/*:a return <e l='{$a/*:n}'>{<f>{$a/*:s}</f>}</e>",
+  };
+  for (const char* const query : queries) {
+    for (const uint32_t options : {NSXMLNodePreserveWhitespace, NSXMLNodeOptionsNone}) {
+      EXPECT_TRUE(agrees(query, std::string(document), options)) << query;
+    }
+  }
 }
 
 }  // namespace
