@@ -9,6 +9,7 @@
 #include "Expr/XQueryLeaves.h"
 #include "Functions/XQueryBuiltInFunction.h"
 #include "Functions/XQueryFunctionCall.h"
+#include "Plan/DocumentAnalysis.h"
 #include "Prolog/XQueryDeclarations.h"
 
 #include <algorithm>
@@ -25,19 +26,7 @@ namespace {
 constexpr int mostDepth = 200;
 constexpr size_t mostPlaces = 200;
 
-// From an element of at most so many levels the descendant axis finds no element outside of it:
-// were there neither a next sibling of it nor of its parent, then no element would follow.
-constexpr size_t levelsThatHoldDescendants = 3;
 constexpr size_t unknownLevel = SIZE_MAX;
-
-struct Refusal {
-  XQueryPlaceID place;
-  std::string_view reason;
-};
-
-[[noreturn]] void refuse(XQueryPlaceID place, std::string_view reason) {
-  throw Refusal{place, reason};
-}
 
 // What nodes of the document a value may hold.
 class Sources {
@@ -99,38 +88,21 @@ Test testOf(const XQueryExpr& expr) {
   return {Test::Anything, {}, true};
 }
 
-bool asksForAnyNode(const XQueryExpr* test) {
-  const auto* type = dyn_cast<XQueryTypeDeclaration>(test);
-  return type && type->type() == XQueryTypeDeclaration::AnyKindTest;
-}
-
-// The first half of "//".
-bool skipsLevels(const XQueryAxisStep& step) {
-  return step.axis() == XQueryAxisDescendantOrSelf && asksForAnyNode(step.expr()) &&
-         step.predicates().empty();
-}
-
-class Analysis {
+class Analysis : private XQueryDocumentAnalysis<XQueryProjectionPlan> {
  public:
-  Analysis(const XQueryProgram& program, const XQueryFactTable& facts)
-      : _program(program), _facts(facts) {}
+  using XQueryDocumentAnalysis::XQueryDocumentAnalysis;
 
   XQueryProjectionPlan run() {
-    try {
+    return planBy([this] {
       for (const XQueryProgramBody& body : _program.bodies()) {
         if (!body.expr) continue;
         if (body.variable) takeGlobal(body);
         if (!body.variable && !body.function) takeBody(body.place);
       }
-    } catch (const Refusal& refusal) {
-      _plan.refusedAt = refusal.place;
-      _plan.reason = refusal.reason;
-    }
-    return std::move(_plan);
+    });
   }
 
  private:
-  const XQueryExpr* exprAt(XQueryPlaceID place) const { return _program[place].expr; }
   XMLProjection& projection() { return _plan.projection; }
 
   void takeBody(XQueryPlaceID body) {
@@ -395,6 +367,12 @@ class Analysis {
     return handedOn;
   }
 
+  // The first half of "//".
+  static bool skipsLevels(const XQueryAxisStep& step) {
+    return step.axis() == XQueryAxisDescendantOrSelf && asksForAnyNode(step.expr()) &&
+           step.predicates().empty();
+  }
+
   // --- paths -----------------------------------------------------------------------------------
 
   Sources path(XQueryPlaceID place, const Sources& focus) {
@@ -557,9 +535,6 @@ class Analysis {
     }
   }
 
-  const XQueryProgram& _program;
-  const XQueryFactTable& _facts;
-  XQueryProjectionPlan _plan;
   std::vector<size_t> _levels = {0};                      // of the places
   std::unordered_map<XQueryPlaceID, Sources> _variables;  // by the clause that sets them
   int _depth = 0;

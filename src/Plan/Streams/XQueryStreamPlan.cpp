@@ -7,6 +7,7 @@
 #include "Expr/XQueryLeaves.h"
 #include "Functions/XQueryBuiltInFunction.h"
 #include "Functions/XQueryFunctionCall.h"
+#include "Plan/DocumentAnalysis.h"
 #include "Plan/Rules/PlaceInside.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryNumber.h"
@@ -17,10 +18,6 @@
 namespace xquery {
 
 namespace {
-
-// From an element of at most so many levels the descendant axis stays inside: were there neither a
-// next sibling of it nor of its parent, then nothing follows it.
-constexpr size_t levelsThatHoldDescendants = 3;
 
 // What the reader can look for.
 constexpr size_t mostSteps = 63;
@@ -38,44 +35,24 @@ constexpr FoldOfFunction folds[] = {
     {"subsequence", XQueryStreamFold::Part},
 };
 
-struct Refusal {
-  XQueryPlaceID place;
-  std::string_view reason;
-};
-
-[[noreturn]] void refuse(XQueryPlaceID place, std::string_view reason) {
-  throw Refusal{place, reason};
-}
-
-bool asksForAnyNode(const XQueryExpr* test) {
-  const auto* type = dyn_cast<XQueryTypeDeclaration>(test);
-  return type && type->type() == XQueryTypeDeclaration::AnyKindTest;
-}
-
 bool asksForAnyElement(const XQueryExpr* test) {
   const auto* wildCard = dyn_cast<XQueryWildCardNameTest>(test);
   return wildCard && !wildCard->prefix() && !wildCard->localName();
 }
 
 // Goes over the program from the body to the path that finds the records.
-class Analysis {
+class Analysis : private XQueryDocumentAnalysis<XQueryStreamPlan> {
  public:
-  Analysis(const XQueryProgram& program, const XQueryFactTable& facts)
-      : _program(program), _facts(facts) {}
+  using XQueryDocumentAnalysis::XQueryDocumentAnalysis;
 
   XQueryStreamPlan run() {
-    try {
+    return planBy([this] {
       checkGlobals();
       takeBody(_program.bodies().back().place);
-    } catch (const Refusal& refusal) {
-      _plan.refusedAt = refusal.place;
-      _plan.reason = refusal.reason;
-    }
-    return std::move(_plan);
+    });
   }
 
  private:
-  const XQueryExpr* exprAt(XQueryPlaceID place) const { return _program[place].expr; }
   XQueryPlaceID inside(XQueryPlaceID place) const { return XQueryPlaceInside(_program, place); }
 
   // Globals are evaluated before the first record is read.
@@ -396,9 +373,6 @@ class Analysis {
     checkPredicates(step);
   }
 
-  const XQueryProgram& _program;
-  const XQueryFactTable& _facts;
-  XQueryStreamPlan _plan;
   XQueryPlaceID _part = XQueryNoPlace;  // of the path, the next of those of the step at hand
   bool _isAnywhere = false;             // "//" has been met and waits for the name behind it
   bool _isComplete = false;
