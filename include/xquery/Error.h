@@ -1,5 +1,4 @@
-// Failures. A host sees them as XQueryError objects; inside the engine a run-time failure travels
-// as an NSException, which never leaves the public interface.
+// Failures, which a host sees as XQueryError objects: nothing is thrown at it.
 #pragma once
 
 #include "xquery/Object.h"
@@ -187,11 +186,6 @@ class XQUERY_EXPORT XQueryError : public NSError {
   // two blanks, "at ", the URL and ":5".
   Ref<NSString> localizedDescription() const override;
 
-  // For the engine itself: what place and calls are found in, and the same error with that.
-  const NSCounted* _trace() const { return _placeAndCalls.get(); }
-  [[nodiscard]] static Ref<XQueryError> _errorWithTrace(const XQueryError& error,
-                                                        Ref<NSCounted> trace);
-
  protected:
   XQueryError(XQueryErrorCategory category, int64_t number, Ref<NSString> msg, int64_t line,
               Ref<NSString> sourceLine = nullptr, int64_t column = 0);
@@ -208,20 +202,7 @@ class XQUERY_EXPORT XQueryError : public NSError {
   int64_t _column;
   Ref<NSString> _moduleURL;
   Ref<NSCounted> _placeAndCalls;
-};
-
-// The one exception type of the engine, thrown and caught inside it; a run-time error has the name
-// "XQueryError" and the error's description as its reason.
-class XQUERY_EXPORT NSException {
- public:
-  NSException(std::string name, Ref<NSString> reason)
-      : _name(std::move(name)), _reason(std::move(reason)) {}
-  const std::string& name() const { return _name; }
-  const Ref<NSString>& reason() const { return _reason; }
-
- private:
-  std::string _name;
-  Ref<NSString> _reason;
+  friend class XQueryErrorTrace;
 };
 
 }  // namespace xquery

@@ -208,11 +208,4 @@ class XQUERY_EXPORT NSDecimalNumber : public NSNumber {
   friend Ref<T> make(Arguments&&...);
 };
 
-// Scans a double by the same rule as NSDecimal::scan. "inf", "nan" and hexadecimal forms are not
-// numbers; what overflows becomes an infinity.
-XQUERY_EXPORT bool scanDouble(NSStringView text, double& out);
-// The printing rule of `stringValue` for a finite double or float.
-XQUERY_EXPORT std::string formatDouble(double value);
-XQUERY_EXPORT std::string formatFloat(float value);
-
 }  // namespace xquery

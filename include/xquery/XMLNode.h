@@ -27,7 +27,11 @@
 // child's previous sibling field holds the last child.
 //
 // Adding a parentless node to another tree moves it: its identity stays, and the two arenas become
-// one. Reading a tree from several threads at once is safe while nobody changes it.
+// one. Reading a tree from several threads at once is safe while nobody changes it; a document that
+// is frozen (Building.h) cannot be changed: what would change it does nothing and answers false.
+//
+// What a walk looks at stands in the classes below, so that it is one load and no call: a query is
+// mostly such walks.
 #pragma once
 
 #include "xquery/Data.h"
@@ -66,16 +70,7 @@ struct NSXMLName {
   uint64_t hash;
 };
 
-// The head of a tree; the rest of it is the library's own.
-struct NSXMLTreeHead {
-  enum Order : uint8_t {
-    Fresh,         // one root, and all numbers are good
-    Stale,         // one root, numbers to be assigned anew
-    SeveralRoots,  // each root's own number tells whether the numbers under it are good
-  };
-  uint32_t references = 0;
-  uint8_t order = Fresh;
-};
+struct NSXMLBlock;  // a piece of an arena
 
 // Parsing options; the bit numbers are part of the interface.
 enum NSXMLOptions : uint32_t {
@@ -131,15 +126,6 @@ class NSXMLLink {
 };
 
 static_assert(sizeof(uintptr_t) == 8 && sizeof(NSXMLLink<void>) == 4);
-
-// The head of a piece of an arena.
-struct NSXMLBlock {
-  NSXMLTreeHead* tree;
-  NSXMLLink<NSXMLBlock> next;
-  uint32_t roomUnits;  // behind the head, in units of 8 bytes
-};
-
-static_assert(sizeof(NSXMLBlock) == 16);
 
 // Told how many bytes of a file, which may be packed, have been read so far, after each piece of at
 // most a few hundred kilobytes, and how many the file has; that is 0 for what has no size, as a
@@ -214,15 +200,6 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
   // --- order ------------------------------------------------------------------------------------
   // Document order within one tree: -1, 0, 1. Both nodes must have the same root.
   static int compareOrder(const NSXMLNode* a, const NSXMLNode* b);
-  // Whether both nodes hang under one root and that root's order numbers can be compared directly.
-  static bool haveComparableOrder(const NSXMLNode* a, const NSXMLNode* b) {
-    const NSXMLTreeHead* tree = a->block()->tree;
-    if (tree != b->block()->tree) return false;
-    if (__atomic_load_n(&tree->order, __ATOMIC_ACQUIRE) == NSXMLTreeHead::Fresh) return true;
-    return makeOrderComparable(a, b);
-  }
-  // The order number; meaningful between nodes for which haveComparableOrder answered true.
-  uint32_t orderNumber() const { return _word; }
 
   // --- changes ----------------------------------------------------------------------------------
   // Sets the own text; replaces the children of an element. A comment that stands in a query as it
@@ -287,7 +264,6 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
     return reinterpret_cast<const NSXMLBlock*>(reinterpret_cast<const char*>(this) -
                                                size_t{_aux} * 8);
   }
-  static bool makeOrderComparable(const NSXMLNode* a, const NSXMLNode* b);
 
   alignas(8) NSXMLLink<NSXMLNode> _parent;
   NSXMLLink<NSXMLNode> _next;
@@ -302,6 +278,7 @@ class XQUERY_EXPORT NSXMLNode : public NSObject {
   };
   friend class NSXMLTree;
   friend class NSXMLElement;
+  friend struct NSXMLNodeOrder;
 };
 
 // Names are qualified names as written; the URI is the namespace ("" for none).
@@ -441,24 +418,5 @@ class XQUERY_EXPORT NSXMLDocument : public NSXMLNode {
 };
 
 static_assert(sizeof(NSXMLNode) == 24 && sizeof(NSXMLElement) == 32 && sizeof(NSXMLDocument) == 32);
-
-// Interned names. The returned pointer stays valid while a handle to it lives.
-class XQUERY_EXPORT NSXMLExpandedNameRef {
- public:
-  NSXMLExpandedNameRef() = default;
-  // An empty URI is no namespace.
-  NSXMLExpandedNameRef(NSStringView URI, NSStringView localName);
-  // Another handle to a name that somebody has one to, or a node carries.
-  explicit NSXMLExpandedNameRef(const NSXMLExpandedName* name);
-  NSXMLExpandedNameRef(const NSXMLExpandedNameRef& other);
-  NSXMLExpandedNameRef(NSXMLExpandedNameRef&& other) noexcept;
-  NSXMLExpandedNameRef& operator=(NSXMLExpandedNameRef other) noexcept;
-  ~NSXMLExpandedNameRef();
-  const NSXMLExpandedName* get() const { return _name; }
-  explicit operator bool() const { return _name != nullptr; }
-
- private:
-  const NSXMLExpandedName* _name = nullptr;
-};
 
 }  // namespace xquery

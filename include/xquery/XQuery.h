@@ -110,9 +110,6 @@ class XQUERY_EXPORT XQuery : public NSCounted {
   //   if (auto plan = query->planDescription(XQueryPlanFormat::Text)) show(plan->utf8());
   Ref<NSString> planDescription(XQueryPlanFormat format) const;
 
-  // For the engine itself.
-  XQueryInternal& _internal() const { return *_private; }
-
  protected:
   explicit XQuery(std::unique_ptr<XQueryInternal> internal);
   ~XQuery() override;
@@ -121,6 +118,7 @@ class XQUERY_EXPORT XQuery : public NSCounted {
 
  private:
   std::unique_ptr<XQueryInternal> _private;
+  friend struct XQueryShell;
 };
 
 // A document that a query named and that is missing, malformed or forbidden; in UTF-8.
@@ -262,9 +260,12 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   // Accepts its arguments and does nothing.
   void contextAddClientSelector(std::string_view selector, std::string_view forName);
 
-  // For the engine itself.
-  void _traceValue(const Value& value, const Ref<NSString>& forLabel);
-  XQueryContextInternal& _internal() const { return *_private; }
+  // Forgets what earlier evaluations left behind, as if the context were new: the context item, the
+  // clock, documents and missing ones, the last error, the profile. Client, namespaces, loading
+  // settings and limits stay. What it held is freed, but for what results of the host refer to; see
+  // Memory.h for the memory itself. Answer: whether it did, which it does not while an evaluation
+  // against the context is under way.
+  bool contextReset();
 
  protected:
   XQueryContext();
@@ -279,6 +280,7 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
                        const std::function<Value()>& body);
   Ref<NSArray> shapedResult(const Value& result, Ref<XQueryError>* error);
   std::unique_ptr<XQueryContextInternal> _private;
+  friend struct XQueryContextShell;
 };
 
 // --- looking at the library ----------------------------------------------------------------------

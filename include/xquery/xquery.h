@@ -1,10 +1,13 @@
 // Everything a host program needs.
 #pragma once
 
+#include "xquery/Building.h"
 #include "xquery/Collection.h"
 #include "xquery/Data.h"
 #include "xquery/Date.h"
 #include "xquery/Error.h"
+#include "xquery/Evaluating.h"
+#include "xquery/Exception.h"
 #include "xquery/LimitedWork.h"
 #include "xquery/Limits.h"
 #include "xquery/Loading.h"
@@ -13,10 +16,12 @@
 #include "xquery/Object.h"
 #include "xquery/Profile.h"
 #include "xquery/Projection.h"
+#include "xquery/Result.h"
 #include "xquery/Serializing.h"
 #include "xquery/Stream.h"
 #include "xquery/String.h"
 #include "xquery/URL.h"
+#include "xquery/Values.h"
 #include "xquery/Warnings.h"
 #include "xquery/XMLNode.h"
 #include "xquery/XQuery.h"

@@ -148,8 +148,8 @@ Value valueOf(const XQueryChecking& checking, XQueryPlaceID place) {
   const auto context = XQueryContext::xqueryContext();
   const Value value = normalised(checking.at(place).expr->evaluateWithContext(*context));
   if (!XQueryHasFailed(value, *context)) return value;
-  if (context->_internal().isFailingForGood()) context->_internal().throwFailure();
-  context->_internal().passOverFailure(nullptr);
+  if (_internal(*context).isFailingForGood()) _internal(*context).throwFailure();
+  _internal(*context).passOverFailure(nullptr);
   return {};
 }
 

@@ -1,5 +1,7 @@
 #include "Context/FailureTrace.h"
 
+#include "Platform/Base/XQueryErrorTrace.h"
+
 #include <algorithm>
 
 namespace xquery {
@@ -17,7 +19,7 @@ Ref<XQueryError> XQueryFailureTrace::on(const XQueryError& error,
   const uint64_t firstKnown = std::max(most, _count - std::min(_count, most));
   if (_count > firstKnown) trace->addUnknown(static_cast<int64_t>(firstKnown - most));
   for (uint64_t index = firstKnown; index < _count; ++index) add(_outermost[index % most]);
-  return XQueryError::_errorWithTrace(error, trace);
+  return XQueryErrorTrace::error(error, trace);
 }
 
 }  // namespace xquery

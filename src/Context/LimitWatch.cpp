@@ -1,6 +1,7 @@
 #include "Context/LimitWatch.h"
 
 #include "Context/XQueryContextInternal.h"
+#include "xquery/Exception.h"
 
 #include <algorithm>
 
@@ -125,7 +126,7 @@ void XQueryLimitWatch::lookAtWork() {
   abandonedValues = &_abandoned;
   _abandoned.setOver();
   workMeter.stepsLeft = 0;
-  if (_context) _context->_internal().raise(_error);
+  if (_context) _internal(*_context).raise(_error);
   throw NSException("XQueryError", _error->description());
 }
 

@@ -91,7 +91,7 @@ void XQueryCheckStackFor(XQueryContextInternal& context, size_t bytes) {
 }
 
 void XQueryCheckStackClosely(XQueryContext& context) {
-  if (!XQueryStackHasRoom()) context._internal().raise(XQueryErrors::nestedTooDeeply.error());
+  if (!XQueryStackHasRoom()) _internal(context).raise(XQueryErrors::nestedTooDeeply.error());
   if (workMeter.stepsLeft <= 0) lookAtWork();
 }
 

@@ -3,6 +3,7 @@
 #include "Context/ProfileRecorder.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Base/XQueryErrorTrace.h"
 #include "Platform/Tree/Arena.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
@@ -10,6 +11,7 @@
 #include "Types/XQueryDate.h"
 #include "Types/XQueryNodeFunctions.h"
 #include "xquery/Collection.h"
+#include "xquery/Exception.h"
 
 #include <atomic>
 #include <new>
@@ -34,6 +36,13 @@ XQueryContextInternal::XQueryContextInternal(XQueryContext& owner)
     : _owner(owner), _baseURIOwner(nextBaseURIOwner()), _loader(NSURLLoader::loaderWithLoading()) {}
 
 XQueryContextInternal::~XQueryContextInternal() = default;
+
+void XQueryContextInternal::takeSettings(XQueryContextInternal& of) {
+  _contextNamespaces = std::move(of._contextNamespaces);
+  _client = std::move(of._client);
+  _limits = std::move(of._limits);
+  setLoading(of.loader().loading());
+}
 
 NSObject* XQueryContextInternal::globalForQName(const XQueryQName& qName) const {
   const auto found = _globals.find(qName);
@@ -201,8 +210,8 @@ Ref<XQueryError> XQueryContextInternal::traced(const Ref<XQueryError>& error) co
 Ref<XQueryError> XQueryContextInternal::placed(const Ref<XQueryError>& error,
                                                XQueryPlaceNumber at) const {
   if (!_prolog || XQueryErrorTrace::of(*error)) return error;
-  return XQueryError::_errorWithTrace(
-      *error, XQueryErrorTrace::traceInPlaces(_prolog->modules().places(), at));
+  return XQueryErrorTrace::error(*error,
+                                 XQueryErrorTrace::traceInPlaces(_prolog->modules().places(), at));
 }
 
 void XQueryContextInternal::passOverFailure(Ref<XQueryError> error) {
@@ -230,15 +239,15 @@ void XQueryContextInternal::raise(Ref<XQueryError> error, XQueryPlaceNumber at) 
 }
 
 void XQueryRaise(XQueryContext& context, Ref<XQueryError> error) {
-  context._internal().raise(std::move(error));
+  _internal(context).raise(std::move(error));
 }
 
 Ref<NSString> XQueryDefaultElementNamespace(const XQueryContext& context) {
-  return context._internal().defaultElementNamespace();
+  return _internal(context).defaultElementNamespace();
 }
 
 Ref<NSString> XQueryNamespaceForPrefix(const XQueryContext& context, NSStringView prefix) {
-  return context._internal().namespaceForPrefix(prefix);
+  return _internal(context).namespaceForPrefix(prefix);
 }
 
 XQueryProfileRecorder& XQueryContextInternal::profileOf(

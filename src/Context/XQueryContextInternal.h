@@ -12,6 +12,7 @@
 #include "Types/XQueryBaseURIs.h"
 #include "Types/XQueryQName.h"
 #include "xquery/Error.h"
+#include "xquery/Exception.h"
 #include "xquery/Object.h"
 #include "xquery/XMLNode.h"
 #include "xquery/XQuery.h"
@@ -40,6 +41,8 @@ class XQueryContextInternal {
   // `owner` is what the host knows the context by.
   explicit XQueryContextInternal(XQueryContext& owner);
   ~XQueryContextInternal();
+  // For one that takes the place of another: what the host set there.
+  void takeSettings(XQueryContextInternal& of);
 
   // --- variables -------------------------------------------------------------------------------
   // Null for an ID below 1 or past the end; a slot that was never set holds NSNull.
@@ -174,6 +177,21 @@ class XQueryContextInternal {
   std::shared_ptr<XQueryClient> client() const { return _client; }
   void setClient(std::shared_ptr<XQueryClient> client) { _client = std::move(client); }
 
+  // An evaluation against the context is under way as long as one of these lives; they may nest.
+  class UnderWay {
+   public:
+    explicit UnderWay(XQueryContextInternal& context) : _context(context) {
+      ++_context._evaluations;
+    }
+    ~UnderWay() { --_context._evaluations; }
+    UnderWay(const UnderWay&) = delete;
+    UnderWay& operator=(const UnderWay&) = delete;
+
+   private:
+    XQueryContextInternal& _context;
+  };
+  bool isEvaluating() const { return _evaluations > 0; }
+
   // Whether diagnostics show every error, as the environment said when the evaluation began. Asking
   // the environment takes longer than many an expression does.
   bool showsErrors() const { return _showsErrors; }
@@ -238,6 +256,7 @@ class XQueryContextInternal {
   Value _contextItem;
   int64_t _position = 0;
   int64_t _last = 0;
+  uint32_t _evaluations = 0;
   bool _ordered = true;
   bool _showsErrors = XQueryLogEnabled();
   Failure _failure = Failure::None;
@@ -245,9 +264,20 @@ class XQueryContextInternal {
   XQueryFailureTrace _failureTrace;
 };
 
+// What a context is to the engine.
+struct XQueryContextShell {
+  static XQueryContextInternal& internal(const XQueryContext& context) { return *context._private; }
+};
+inline XQueryContextInternal& _internal(const XQueryContext& context) {
+  return XQueryContextShell::internal(context);
+}
+
+// Hands a traced value to the client, or to the log where there is none.
+void _traceValue(XQueryContext& context, const Value& value, const Ref<NSString>& forLabel);
+
 // Whether the expression that answered this has met an error.
 inline bool XQueryHasFailed(const Value& answer, const XQueryContext& context) {
-  return !answer && context._internal().isFailing();
+  return !answer && _internal(context).isFailing();
 }
 
 }  // namespace xquery

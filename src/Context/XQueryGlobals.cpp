@@ -27,7 +27,7 @@ template <class Declaration>
 
 void evaluateVariable(const XQueryVarDecl& declaration, XQueryContext& publicContext) {
   constexpr auto& unresolved = XQueryErrors::unresolvedExternalVariable;
-  auto& context = publicContext._internal();
+  auto& context = _internal(publicContext);
   const XQueryQName& name = *declaration.name();
   if (declaration.isExternal()) {
     if (!context.globalForQName(name)) raiseUnresolved(unresolved, declaration, context);
@@ -87,7 +87,7 @@ void XQuerySetConstants(const XQueryConstants& constants, const XQueryProlog& pr
     const auto text = NSString::stringWithUTF8(name);
     if (!text || !value) continue;
     if (const auto qName = prolog.variableQNameFromString(text)) {
-      context._internal().setGlobal(value, qName);
+      _internal(context).setGlobal(value, qName);
     }
   }
 }
@@ -100,7 +100,7 @@ void XQueryEvaluateDeclarations(const XQueryProlog& prolog, XQueryContext& conte
     if (const auto* variable = dyn_cast<XQueryVarDecl>(declaration)) {
       if (&variable->prolog() == &prolog) evaluateVariable(*variable, context);
     } else if (const auto* function = dyn_cast<XQueryFunctionDecl>(declaration)) {
-      checkFunction(*function, context._internal());
+      checkFunction(*function, _internal(context));
     }
   }
 }

@@ -5,6 +5,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Platform/Base/HostFailure.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Base/XQueryErrorTrace.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/XMLNode.h"
@@ -19,7 +20,7 @@ class OneDeeper {
  public:
   explicit OneDeeper(XQueryContext& outer) {
     if (innerQueries == XQueryMostInnerQueries) {
-      outer._internal().raise(XQueryErrors::nestedTooDeeply.error());
+      _internal(outer).raise(XQueryErrors::nestedTooDeeply.error());
     }
     ++innerQueries;
   }
@@ -42,7 +43,7 @@ void refuseOtherItems(XQueryInnerResult& result) {
 
 // The text of an inner query stands in the module that is being evaluated.
 std::string moduleURLOf(const XQueryContext& context) {
-  const XQueryProlog* prolog = context._internal().activeProlog();
+  const XQueryProlog* prolog = _internal(context).activeProlog();
   const bool isKnown = prolog && prolog->moduleURL();
   return isKnown ? prolog->moduleURL()->absoluteString()->utf8() : std::string();
 }
@@ -76,8 +77,8 @@ XQueryInnerResult XQueryEvaluateInnerQuery(const Ref<NSString>& source, const Va
     result.items = context->evaluateXQuery(*query, {}, contextItem, &result.error);
   });
   // The text of the inner query is nowhere to be seen: its errors are where it was evaluated.
-  if (result.error) result.error = XQueryError::_errorWithTrace(*result.error, nullptr);
-  if (XQueryIsLimit(result.error.get())) outer._internal().raise(result.error);
+  if (result.error) result.error = XQueryErrorTrace::error(*result.error, nullptr);
+  if (XQueryIsLimit(result.error.get())) _internal(outer).raise(result.error);
   return result;
 }
 

@@ -17,6 +17,7 @@
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryValues.h"
+#include "xquery/Exception.h"
 #include "xquery/XMLNode.h"
 
 #include <algorithm>
@@ -127,7 +128,7 @@ Ref<NSArray> XQuery::parseErrors() const {
 }
 
 std::vector<XQueryWarning> XQueryWarnings(const XQuery& query) {
-  return query._internal().warnings();
+  return _internal(query).warnings();
 }
 
 Ref<NSString> XQuery::planDescription(XQueryPlanFormat format) const {
@@ -154,7 +155,7 @@ Ref<XQueryContext> XQueryContext::xqueryContextWithNamespaces(
   for (const auto& [prefix, URI] : namespaces) {
     const auto prefixString = NSString::stringWithUTF8(prefix);
     const auto URIString = NSString::stringWithUTF8(URI);
-    if (prefixString && URIString) context->_internal().addNamespace(URIString, prefixString);
+    if (prefixString && URIString) _internal(*context).addNamespace(URIString, prefixString);
   }
   return context;
 }
@@ -190,29 +191,21 @@ const XQueryLimits& XQueryContext::contextLimits() const {
   return _private->limits();
 }
 
+bool XQueryContext::contextReset() {
+  if (_private->isEvaluating()) return false;
+  auto fresh = std::make_unique<XQueryContextInternal>(*this);
+  fresh->takeSettings(*_private);
+  _private = std::move(fresh);
+  return true;
+}
+
 void XQueryContext::contextAddClientSelector(std::string_view, std::string_view) {}
 
-namespace {
-
-void logTrace(const Value& value, const Ref<NSString>& label) {
-  if (!XQueryLogEnabled()) return;
-  NSLog(XQueryDescription(label.get())->utf8() + " " + XQueryDescription(value.get())->utf8());
-}
-
-}  // namespace
-
-void XQueryClient::XQueryClientTraceValue(const Value& value, const Ref<NSString>& label,
-                                          XQueryContext&) {
-  logTrace(value, label);
-}
-
-void XQueryClient::XQueryClientMissesDocument(const XQueryMissingDocument&, XQueryContext&) {}
-
-void XQueryContext::_traceValue(const Value& value, const Ref<NSString>& forLabel) {
-  if (const auto client = _private->client()) {
-    passingOnHostFailures([&] { client->XQueryClientTraceValue(value, forLabel, *this); });
+void _traceValue(XQueryContext& context, const Value& value, const Ref<NSString>& forLabel) {
+  if (const auto client = _internal(context).client()) {
+    passingOnHostFailures([&] { client->XQueryClientTraceValue(value, forLabel, context); });
   } else {
-    logTrace(value, forLabel);
+    XQueryClient().XQueryClientTraceValue(value, forLabel, context);
   }
 }
 
@@ -264,10 +257,11 @@ class Profiling {
 
 Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryConstants& constants,
                                            const Value& contextItem, Ref<XQueryError>* error) {
-  const XQueryInternal& compiled = query._internal();
+  const XQueryInternal& compiled = _internal(query);
   if (error) *error = nullptr;
   if (compiled.isError()) return shapedResult(query.parseErrors(), error);
 
+  const XQueryContextInternal::UnderWay underWay(*_private);
   const NSXMLEra era;
   const Profiling profiling(*_private, compiled.profiledProgram());
   beginEvaluation(compiled);

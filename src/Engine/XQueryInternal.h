@@ -65,4 +65,12 @@ class XQueryInternal {
   std::shared_ptr<const XQueryProfiledProgram> _profiledProgram;
 };
 
+// What a query is to the engine.
+struct XQueryShell {
+  static XQueryInternal& internal(const XQuery& query) { return *query._private; }
+};
+inline XQueryInternal& _internal(const XQuery& query) {
+  return XQueryShell::internal(query);
+}
+
 }  // namespace xquery

@@ -8,7 +8,7 @@
 namespace xquery {
 
 XQueryProfile::XQueryProfile(const XQuery& query) {
-  const auto& program = query._internal().profiledProgram();
+  const auto& program = _internal(query).profiledProgram();
   const XQueryProfileCounts none(program ? program->counted.size() : 0);
   _data = std::make_unique<XQueryProfileData>(XQueryProfileData{program, none});
 }
@@ -18,7 +18,7 @@ XQueryProfile::XQueryProfile(XQueryProfile&& other) noexcept = default;
 XQueryProfile& XQueryProfile::operator=(XQueryProfile&& other) noexcept = default;
 
 bool XQueryProfile::add(const XQueryContext& context) {
-  const XQueryProfileRecorder* recorder = context._internal().profile();
+  const XQueryProfileRecorder* recorder = _internal(context).profile();
   if (!recorder || !_data->program || recorder->program() != _data->program) return false;
   _data->counts.add(recorder->counts());
   return true;

@@ -11,14 +11,14 @@ namespace {
 
 // Null where all is needed.
 const XMLProjection* projectionOf(const XQuery& query) {
-  const XQueryProjectionPlan* const plan = query._internal().projectionPlan();
+  const XQueryProjectionPlan* const plan = _internal(query).projectionPlan();
   return plan && plan->isPossible() ? &plan->projection : nullptr;
 }
 
 }  // namespace
 
 XQueryProjection XQueryProjectionOf(const XQuery& query) {
-  const XQueryProjectionPlan* const plan = query._internal().projectionPlan();
+  const XQueryProjectionPlan* const plan = _internal(query).projectionPlan();
   if (!plan) return {true, true, "the query is not planned"};
   if (!plan->isPossible()) return {true, true, std::string(plan->reason)};
   return {false, plan->answersNodes, plan->projection.description()};

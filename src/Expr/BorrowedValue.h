@@ -35,9 +35,9 @@ class XQueryBorrowedValue {
       case Kind::Literal:
         return &cast<XQueryLiteral>(&expr)->literalValue();
       case Kind::Variable:
-        return context._internal().variableSlotForID(cast<XQueryVariable>(&expr)->varID());
+        return _internal(context).variableSlotForID(cast<XQueryVariable>(&expr)->varID());
       case Kind::ContextItemExpr:
-        return &context._internal().contextItem();
+        return &_internal(context).contextItem();
       default:
         return nullptr;
     }

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Expr/XQueryExpr.h"
+#include "xquery/Exception.h"
 
 #include <exception>
 

@@ -13,11 +13,11 @@ Ref<NSString> XQueryExpr::description() const {
 }
 
 void XQueryCatchRaised(XQueryContext& context, const XQueryExpr& expr) {
-  context._internal().failAsRaised(expr.exprPlace());
+  _internal(context).failAsRaised(expr.exprPlace());
 }
 
 void XQueryCatchFailure(XQueryContext& context, const XQueryExpr& expr) {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   try {
     throw;
   } catch (const std::bad_alloc&) {

@@ -18,6 +18,7 @@
 
 #include "Platform/Base/XQueryPlaces.h"
 #include "xquery/Error.h"
+#include "xquery/Exception.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 

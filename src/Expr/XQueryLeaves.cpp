@@ -2,6 +2,7 @@
 
 #include "Context/XQueryContextInternal.h"
 #include "Platform/Base/LastingObjects.h"
+#include "Platform/Numbers/NumberText.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryNumber.h"
@@ -59,7 +60,7 @@ void XQueryVariable::bindInfoForProlog(XQueryProlog& prolog) {
 }
 
 Value XQueryVariable::computeValue(XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   NSObject* value = nullptr;
   if (_varID != 0) {
     // An empty local slot is never looked up among the globals.
@@ -84,7 +85,7 @@ XQueryContextItem* XQueryContextItem::contextItem() {
 }
 
 Value XQueryContextItem::computeValue(XQueryContext& context) const {
-  return context._internal().contextItem();
+  return _internal(context).contextItem();
 }
 
 XQueryQNameReference::XQueryQNameReference(Ref<NSString> name, Ref<XQueryQName> qName, int64_t line)
@@ -108,7 +109,7 @@ Value XQueryQNameReference::computeValue(XQueryContext& context) const {
 
 Ref<XQueryQName> XQueryQNameReference::qNameForContext(XQueryContext& context) const {
   if (_qName) return _qName;
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   if (_localPart && _localPart->length() > 0) {
     const Ref<NSString> URI = dynamic.contextNamespaceForPrefix(_prefix->view());
     if (URI || _prefix->length() == 0) {

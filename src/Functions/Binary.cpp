@@ -16,7 +16,7 @@ namespace {
 // Of a URI the cast answers the error that it raises of everything else.
 Value binaryOfType(XQueryTypeID type, const Value& value, XQueryContext& context) {
   Value binary = XQueryCastAsTypeForContext(value, type, context);
-  if (auto* error = dyn_cast<XQueryError>(binary.get())) context._internal().raise(error);
+  if (auto* error = dyn_cast<XQueryError>(binary.get())) _internal(context).raise(error);
   return binary;
 }
 

@@ -15,23 +15,23 @@ Value countInFocus(int64_t number) {
 }  // namespace
 
 Value fn_position(const Value*, size_t count, XQueryContext& context) {
-  return count == 0 ? countInFocus(context._internal().position()) : Value();
+  return count == 0 ? countInFocus(_internal(context).position()) : Value();
 }
 
 Value fn_last(const Value*, size_t count, XQueryContext& context) {
-  return count == 0 ? countInFocus(context._internal().last()) : Value();
+  return count == 0 ? countInFocus(_internal(context).last()) : Value();
 }
 
 Value fn_static_base_uri(const Value*, size_t count, XQueryContext& context) {
   if (count != 0) return Value();
-  const Ref<NSString> URI = context._internal().baseURI();
+  const Ref<NSString> URI = _internal(context).baseURI();
   if (!URI || URI->length() == 0) return NSNull::null();
   return XQueryCastAsTypeForContext(URI, XQueryTypeAnyURI, context);
 }
 
 Value fn_default_collation(const Value*, size_t count, XQueryContext& context) {
   if (count != 0) return Value();
-  const Ref<NSString> URI = context._internal().defaultCollation();
+  const Ref<NSString> URI = _internal(context).defaultCollation();
   return XQueryCastAsTypeForContext(URI ? URI : NSString::empty(), XQueryTypeString, context);
 }
 

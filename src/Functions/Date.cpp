@@ -76,7 +76,7 @@ Value XQueryDateDifference(XQueryTypeID type, const Value* arguments, size_t cou
 
 Value XQueryDateOfPresent(XQueryTypeID type, size_t count, XQueryContext& context) {
   if (count != 0) return Value();
-  return XQueryDate::xqueryDateWithInstant(context._internal().currentDateTime()->instant(),
+  return XQueryDate::xqueryDateWithInstant(_internal(context).currentDateTime()->instant(),
                                            NSTimeZone::localTimeZone(), type);
 }
 

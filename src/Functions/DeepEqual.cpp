@@ -10,6 +10,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryNodeFunctions.h"
+#include "xquery/Exception.h"
 
 #include <vector>
 
@@ -70,7 +71,7 @@ bool same(NSObject* a, NSObject* b, XQueryContext& context) {
 // A third argument, the collation, is not looked at.
 Value fn_deep_equal(const Value* arguments, size_t count, XQueryContext& context) {
   if (count < 2 || count > 3) return Value();
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   try {
     return NSNumber::numberWithBool(same(arguments[0].get(), arguments[1].get(), context));
   } catch (const NSException&) {

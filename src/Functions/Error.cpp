@@ -1,5 +1,6 @@
 #include "Functions/Error.h"
 
+#include "Context/XQueryContextInternal.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryQName.h"
 #include "Types/XQueryTypeTable.h"
@@ -35,7 +36,7 @@ Value fn_error(const Value* arguments, size_t count, XQueryContext& context) {
 Value fn_trace(const Value* arguments, size_t count, XQueryContext& context) {
   if (count != 2) return Value();
   const Value label = XQueryPromoteToString(arguments[1], context);
-  context._traceValue(arguments[0], cast<NSString>(label));
+  _traceValue(context, arguments[0], cast<NSString>(label));
   return arguments[0];
 }
 

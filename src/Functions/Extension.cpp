@@ -60,7 +60,7 @@ Value ext_uri_body(const Value* arguments, size_t count, XQueryContext& context)
   if (reference->length() == 0) return Value();
   const Ref<NSURL> URL = XQueryURLInContext(reference, context);
   if (!URL) return Value();
-  const Ref<NSData> body = context._internal().URLBody(URL);
+  const Ref<NSData> body = _internal(context).URLBody(URL);
   return body ? Value(XQueryHexBinary::binaryWithData(body)) : Value();
 }
 

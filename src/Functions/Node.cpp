@@ -4,6 +4,7 @@
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryTextArgument.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Numbers/NumberText.h"
 #include "Platform/Text/ICUText.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
@@ -11,6 +12,7 @@
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryQName.h"
 #include "Types/XQueryStringFunctions.h"
+#include "xquery/Exception.h"
 
 #include <algorithm>
 
@@ -57,7 +59,7 @@ bool isNoNumber(NSStringView text) {
 
 // Of a cast that raised or would have: no error is left, not even one from before.
 Value noNumber(XQueryContext& context) {
-  context._internal().setError(nullptr, false);
+  _internal(context).setError(nullptr, false);
   return XQueryNumber::nan();
 }
 
@@ -71,7 +73,7 @@ template <class Resolve>
 Value nodesForTokens(const Value* arguments, size_t count, Resolve resolve,
                      XQueryContext& context) {
   if (count != 1) return Value();
-  const Value item = context._internal().contextItem();
+  const Value item = _internal(context).contextItem();
   const auto* node = dyn_cast<NSXMLNode>(item.get());
   if (!node) return Value();
   const Ref<NSString> words =
@@ -127,7 +129,7 @@ Value XQueryDoubleOrNaN(const Value& item, XQueryContext& context) {
   try {
     return XQueryCastAsTypeForContext(item, XQueryTypeDouble, context);
   } catch (const NSException&) {
-    if (XQueryIsLimit(context._internal().error().get())) throw;
+    if (XQueryIsLimit(_internal(context).error().get())) throw;
     return noNumber(context);
   }
 }
@@ -172,7 +174,7 @@ Value fn_nilled(const Value* arguments, size_t count, XQueryContext&) {
 // other one too.
 Value fn_lang(const Value* arguments, size_t count, XQueryContext& context) {
   if (count < 1 || count > 2) return Value();
-  const Value item = count == 2 ? arguments[1] : context._internal().contextItem();
+  const Value item = count == 2 ? arguments[1] : _internal(context).contextItem();
   const auto* node = dyn_cast<NSXMLNode>(item.get());
   if (!node) return NSNumber::falseValue();
   const Value requested = XQueryPromoteToString(arguments[0], context);

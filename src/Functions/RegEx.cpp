@@ -46,8 +46,8 @@ size_t stackFor(NSStringView pattern) {
 }
 
 Ref<XQueryRegEx> compiled(NSStringView pattern, NSStringView flags, XQueryContext& context) {
-  XQueryCheckStackFor(context._internal(), stackFor(pattern));
-  std::shared_ptr<XQueryRegExCache>& cache = context._internal().regExCache();
+  XQueryCheckStackFor(_internal(context), stackFor(pattern));
+  std::shared_ptr<XQueryRegExCache>& cache = _internal(context).regExCache();
   if (!cache) cache = std::make_shared<XQueryRegExCache>();
   return cache->regExp(pattern, flags);
 }

@@ -26,7 +26,7 @@ Value asURI(const Ref<NSString>& text, XQueryContext& context) {
 }  // namespace
 
 Ref<NSURL> XQueryURLInContext(const Ref<NSString>& reference, XQueryContext& context) {
-  const XQueryProlog* prolog = context._internal().activeProlog();
+  const XQueryProlog* prolog = _internal(context).activeProlog();
   return prolog ? prolog->URLForLocation(reference) : NSURL::URLWithString(reference);
 }
 
@@ -35,7 +35,7 @@ Value fn_base_uri(const Value* arguments, size_t count, XQueryContext& context) 
   if (count > 1) return Value();
   if (isNull(arguments[0])) return arguments[0];
   const auto* node = dyn_cast<NSXMLNode>(arguments[0].get());
-  return node ? asURI(context._internal().baseURIForNode(node), context) : Value();
+  return node ? asURI(_internal(context).baseURIForNode(node), context) : Value();
 }
 
 // A URI without a scheme names no document.
@@ -57,7 +57,7 @@ Value fn_doc(const Value* arguments, size_t count, XQueryContext& context) {
   const auto* text = cast<NSString>(reference.get());
   if (text->length() == 0) return NSNull::null();
   const Ref<NSURL> URL = XQueryURLInContext(NSString::stringWithView(text->view()), context);
-  return URL ? context._internal().XQueryDocumentForURL(URL) : Value();
+  return URL ? _internal(context).XQueryDocumentForURL(URL) : Value();
 }
 
 // There are no collections: every call is refused.
@@ -70,7 +70,7 @@ Value fn_resolve_uri(const Value* arguments, size_t count, XQueryContext& contex
   if (isNull(arguments[0])) return arguments[0];
   const Value reference = XQueryPromoteToString(arguments[0], context);
   const Ref<NSString> text = cast<NSString>(reference);
-  Ref<NSString> base = context._internal().baseURI();
+  Ref<NSString> base = _internal(context).baseURI();
   if (count == 2) base = cast<NSString>(XQueryPromoteToString(arguments[1], context));
   const Ref<NSURL> URL = resolvedURL(text, base);
   return URL ? XQueryCastAsTypeForContext(URL->absoluteString(), XQueryTypeAnyURI, context)

@@ -106,7 +106,7 @@ inline bool XQueryFunctionCall::makeFrame(XQueryFrameRef& frame, XQueryContext& 
 }
 
 Value XQueryFunctionCall::callDeclared(XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const auto& params = _functionDecl->params();
   if (params.size() != argumentCount()) {
     return evaluateArguments(context) ? failInvalidArguments(context) : Value();
@@ -126,7 +126,7 @@ Value XQueryFunctionCall::callDeclared(XQueryContext& context) const {
 
 // Passes on what the body failed with, or fails for what it gave instead of a value.
 Value XQueryFunctionCall::failInBody(const Value& result, XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   if (auto* error = dyn_cast<XQueryError>(result)) dynamic.fail(error, exprPlace());
   if (!dynamic.isFailing()) return failUndefined(context);
   dynamic.failThroughCall(exprPlace(), _name.get());
@@ -143,7 +143,7 @@ bool XQueryFunctionCall::askBody(const std::function<bool(const XQueryExpr& body
   XQueryCheckStack(context);
   XQueryFrameRef frame;
   if (!makeFrame(frame, context)) return false;
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const CalleeFrame calleeFrame(dynamic, std::move(frame));
   const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
   if (ask(*_functionDecl->expr())) return true;
@@ -162,7 +162,7 @@ Value XQueryFunctionCall::evaluatePartOfBody(const XQueryExpr& part,
     if (XQueryHasFailed(value, context)) return {};
     if (const int64_t varID = params[index]->varID()) frame->setValue(std::move(value), varID);
   }
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const CalleeFrame calleeFrame(dynamic, std::move(frame));
   const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
   Value result = part.evaluateWithContext(context);
@@ -182,7 +182,7 @@ Value XQueryFunctionCall::callBuiltIn(XQueryContext& context) const {
 
 Value XQueryFunctionCall::callBuiltIn(Value* arguments, size_t count,
                                       XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   bool isComplete = true;
   for (size_t index = 0; index < count; ++index) {
     arguments[index] = normalised(argument(index, context));
@@ -197,7 +197,7 @@ Value XQueryFunctionCall::callBuiltIn(Value* arguments, size_t count,
 
 Value XQueryFunctionCall::callBuiltInWith(const Value* arguments, size_t count,
                                           XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const CalleeFrame calleeFrame(dynamic, nullptr);
   Value result = normalised(_function(arguments, count, context));
   if (!result) return failInvalidArguments(context);
@@ -206,13 +206,13 @@ Value XQueryFunctionCall::callBuiltInWith(const Value* arguments, size_t count,
 }
 
 Value XQueryFunctionCall::failUndefined(XQueryContext& context) const {
-  return context._internal().fail(XQueryErrors::undefinedFunction.errorAtLine(exprLine(), _name),
-                                  exprPlace());
+  return _internal(context).fail(XQueryErrors::undefinedFunction.errorAtLine(exprLine(), _name),
+                                 exprPlace());
 }
 
 Value XQueryFunctionCall::failInvalidArguments(XQueryContext& context) const {
-  return context._internal().fail(XQueryErrors::invalidArguments.errorAtLine(exprLine(), _name),
-                                  exprPlace());
+  return _internal(context).fail(XQueryErrors::invalidArguments.errorAtLine(exprLine(), _name),
+                                 exprPlace());
 }
 
 }  // namespace xquery

@@ -21,7 +21,7 @@ void XQueryCheckCollation(const Value* arguments, size_t count, size_t index,
 
 Value XQueryArgumentOrContextItem(const Value* arguments, size_t count, XQueryContext& context) {
   if (count > 1) return Value();
-  return count == 1 ? arguments[0] : context._internal().contextItem();
+  return count == 1 ? arguments[0] : _internal(context).contextItem();
 }
 
 }  // namespace xquery

@@ -33,10 +33,10 @@ Value ext_xslt(const Value* arguments, size_t count, XQueryContext& context) {
   const NSXMLDocument* document = documentOf(arguments, count);
   if (!document) return Value();
   const Value stylesheet = XQueryPromoteToString(arguments[1], context);
-  const XQueryProlog* prolog = context._internal().activeProlog();
+  const XQueryProlog* prolog = _internal(context).activeProlog();
   const Ref<NSURL> base = prolog ? prolog->locationBase() : Ref<NSURL>();
   // The host may set other settings while its loader is called.
-  const Ref<NSURLLoader> loader = &context._internal().loader();
+  const Ref<NSURLLoader> loader = &_internal(context).loader();
   std::string ignored;
   return XMLResultOfStylesheet(*document, *cast<NSString>(stylesheet.get()),
                                base ? base->absoluteString()->utf8() : "", {}, *loader, ignored,
@@ -50,7 +50,7 @@ Value ext_xslt_uri(const Value* arguments, size_t count, XQueryContext& context)
   if (reference->length() == 0) return Value();
   const Ref<NSURL> URL = XQueryURLInContext(reference, context);
   if (!URL) return Value();
-  const Ref<NSURLLoader> loader = &context._internal().loader();
+  const Ref<NSURLLoader> loader = &_internal(context).loader();
   std::string ignored;
   return XMLResultOfStylesheetAtURL(*document, *URL, {}, *loader, ignored, tellingClient(context));
 }

@@ -6,6 +6,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Base/XQueryErrorTrace.h"
 #include "Types/XQueryErrors.h"
+#include "xquery/Exception.h"
 
 #include <algorithm>
 #include <cstring>
@@ -123,8 +124,8 @@ void XQueryParser::setError(Ref<XQueryError> error, std::optional<XQuerySpan> at
 }
 
 Ref<XQueryError> XQueryParser::placed(const Ref<XQueryError>& error, XQuerySpan at) {
-  return XQueryError::_errorWithTrace(*error,
-                                      XQueryErrorTrace::traceInPlaces(_places, _places->add(at)));
+  return XQueryErrorTrace::error(*error,
+                                 XQueryErrorTrace::traceInPlaces(_places, _places->add(at)));
 }
 
 void XQueryParser::setPlace(XQueryExpr& expr, XQuerySpan span) {

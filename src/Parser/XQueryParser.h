@@ -11,6 +11,7 @@
 #include "Platform/Base/XQueryPlaces.h"
 #include "Prolog/XQueryParsedModule.h"
 #include "xquery/Error.h"
+#include "xquery/Exception.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 

@@ -148,8 +148,8 @@ void XQueryProlog::_addItems(const std::vector<Ref<XQueryPrologItem>>& items) {
 
 void XQueryProlog::addError(Ref<XQueryError> error, XQueryPlaceNumber at) {
   if (at != 0 && !XQueryErrorTrace::of(*error)) {
-    error = XQueryError::_errorWithTrace(*error,
-                                         XQueryErrorTrace::traceInPlaces(_modules->places(), at));
+    error =
+        XQueryErrorTrace::error(*error, XQueryErrorTrace::traceInPlaces(_modules->places(), at));
   }
   _errors.push_back(std::move(error));
 }

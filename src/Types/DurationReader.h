@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Numbers/NumberText.h"
 #include "xquery/Number.h"
 #include "xquery/String.h"
 

@@ -1,5 +1,6 @@
 #include "Types/LexicalForms.h"
 
+#include "Platform/Numbers/NumberText.h"
 #include "Platform/Reading/XMLCharacters.h"
 #include "xquery/Number.h"
 

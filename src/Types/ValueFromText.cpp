@@ -1,5 +1,6 @@
 // Values from their lexical forms, as XML Schema Part 2 has them. The casts of the language are
 // more lenient about numbers and less about white space; what both take gives the same value.
+#include "Platform/Numbers/NumberText.h"
 #include "Platform/Reading/XMLCharacters.h"
 #include "Types/LexicalForms.h"
 #include "Types/XQueryBinary.h"

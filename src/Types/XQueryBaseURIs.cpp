@@ -1,6 +1,7 @@
 #include "Types/XQueryBaseURIs.h"
 
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/TreeHead.h"
 #include "Types/XQueryNodeFunctions.h"
 
 #include <algorithm>
@@ -90,7 +91,7 @@ Ref<NSString> XQueryBaseURIs::ofDeepElement(const NSXMLElement* element) {
 // The elements of a way are in document order.
 size_t XQueryBaseURIs::levelsTo(const NSXMLElement* element) const {
   const auto isBefore = [](const Level& level, const NSXMLElement* other) {
-    return level.element->orderNumber() < other->orderNumber();
+    return NSXMLNodeOrder::number(*level.element) < NSXMLNodeOrder::number(*other);
   };
   const auto found = std::lower_bound(_way.begin(), _way.end(), element, isBefore);
   if (found == _way.end() || found->element != element) return 0;

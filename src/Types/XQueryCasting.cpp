@@ -5,6 +5,7 @@
 // only.
 #include "Types/XQueryCasting.h"
 
+#include "Platform/Numbers/NumberText.h"
 #include "Types/TypesContext.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryBinary.h"

@@ -1,5 +1,6 @@
 #include "Types/XQueryDuration.h"
 
+#include "Platform/Numbers/NumberText.h"
 #include "Types/DurationReader.h"
 
 #include <cmath>

@@ -2,6 +2,7 @@
 #include "Types/XQueryNumber.h"
 
 #include "Platform/Base/LastingObjects.h"
+#include "Platform/Numbers/NumberText.h"
 #include "Types/DurationReader.h"
 #include "xquery/Date.h"
 

@@ -1,5 +1,7 @@
 #include "Types/XQueryNumericOperand.h"
 
+#include "Platform/Numbers/NumberText.h"
+
 namespace xquery {
 
 XQueryNumericOperand XQueryNumericOperand::ofUntyped(const NSObject& object) {

@@ -1,5 +1,7 @@
 #include "Types/XQueryQName.h"
 
+#include "Platform/Tree/Names.h"
+
 #include <mutex>
 
 namespace xquery {

@@ -1,6 +1,7 @@
 // Expanded names as values.
 #pragma once
 
+#include "Platform/Tree/Names.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"

@@ -1,5 +1,5 @@
-// What hosts are told whose values are refused or asked for as what they are not: the rows of the
-// catalogue that no query raises.
+// What hosts are told whose values and nodes are refused, or are asked for as what they are not:
+// the rows of the catalogue that no query raises.
 #pragma once
 
 #include "Types/XQueryErrors.h"
@@ -22,8 +22,16 @@ inline constexpr XQueryErrorText<3> fieldOutOfRange{Values, 6, "%@ %@ of %@ is o
 inline constexpr XQueryErrorText<1> notADateType{Values, 6, "%@ is no type of dates and times"};
 inline constexpr XQueryErrorText<1> notMadeFromText{Values, 6, "%@ is not made from a text alone"};
 
+// --- building ------------------------------------------------------------------------------------
+
+inline constexpr XQueryErrorText<> cdataEnds{Values, 0, "a CDATA section cannot contain ]]>"};
+inline constexpr XQueryErrorText<> documentIsFrozen{Internal, 0, "the document is frozen"};
+inline constexpr XQueryErrorText<> nodeHasParent{Internal, 0, "the node has a parent already"};
+inline constexpr XQueryErrorText<> nodeCannotBeThere{Internal, 0, "the node cannot be there"};
+
 // --- reading -------------------------------------------------------------------------------------
 
+inline constexpr XQueryErrorText<1> notReadable{Loading, 0, "%@"};  // a document
 inline constexpr XQueryErrorText<2> itemOfAnotherType{Types, 6, "the item is %@, not %@"};
 inline constexpr XQueryErrorText<> noValue{Types, 6, "there is no value"};
 inline constexpr XQueryErrorText<> emptySequence{

@@ -21,9 +21,9 @@ class BaseURIRecords : public testing::Test {
   std::string xml(std::string_view query, size_t index = 0) {
     return cast<NSXMLNode>(evaluate(query)->objectAtIndex(index))->XMLString()->utf8();
   }
-  size_t count() const { return context->_internal().baseURINodeCount(); }
+  size_t count() const { return _internal(*context).baseURINodeCount(); }
   std::string baseOf(const NSObject* node) const {
-    const auto URI = context->_internal().baseURIForNode(cast<NSXMLNode>(node));
+    const auto URI = _internal(*context).baseURIForNode(cast<NSXMLNode>(node));
     return URI ? URI->utf8() : "(null)";
   }
 

@@ -3,6 +3,7 @@
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
 #include "xquery/Collection.h"
+#include "xquery/Exception.h"
 
 #include <gtest/gtest.h>
 
@@ -21,7 +22,7 @@ Ref<XQueryQName> name(std::string_view local) {
 class DynamicContext : public testing::Test {
  protected:
   Ref<XQueryContext> holder = XQueryContext::xqueryContext();
-  XQueryContextInternal& context = holder->_internal();
+  XQueryContextInternal& context = _internal(*holder);
 };
 
 TEST_F(DynamicContext, StartsOrderedWithoutFocus) {

@@ -1,6 +1,7 @@
 #include "Context/XQueryContextInternal.h"
 #include "Context/XQueryGlobals.h"
 #include "Prolog/PrologTesting.h"
+#include "xquery/Exception.h"
 
 #include <gtest/gtest.h>
 
@@ -18,7 +19,7 @@ class Initializer : public XQueryExpr {
   explicit Initializer(Work work) : XQueryExpr(Kind::OtherExpr), _work(std::move(work)) {}
   void bindInfoForProlog(XQueryProlog&) override {}
   void visitParts(XQueryPartVisitor&) override {}
-  Value computeValue(XQueryContext& context) const override { return _work(context._internal()); }
+  Value computeValue(XQueryContext& context) const override { return _work(_internal(context)); }
 
  private:
   Work _work;
@@ -50,13 +51,13 @@ class Globals : public testing::Test {
     try {
       evaluate(prolog, constants);
     } catch (const NSException&) {
-      const auto& error = context->_internal().error();
+      const auto& error = _internal(*context).error();
       return std::to_string(error->err()) + ": " + error->msg()->utf8();
     }
     return "";
   }
   std::string global(std::string_view local, std::string_view URI = {}) {
-    NSObject* value = context->_internal().globalForQName(*qName(local, URI));
+    NSObject* value = _internal(*context).globalForQName(*qName(local, URI));
     return shown(Value(value));
   }
 
@@ -71,9 +72,9 @@ TEST_F(Globals, ConstantsAreTakenAsGiven) {
   const auto prolog = prologOf({declareNamespace("p", "urn:p")});
   const Value array = NSArray::arrayWithObjects({text("a")});
   evaluate(*prolog, {{"x", array}, {"p:x", text("prefixed")}, {"n", NSNull::null()}});
-  EXPECT_EQ(context->_internal().globalForQName(*qName("x")), array.get());
+  EXPECT_EQ(_internal(*context).globalForQName(*qName("x")), array.get());
   EXPECT_EQ(global("x", "urn:p"), "prefixed");
-  EXPECT_EQ(context->_internal().globalForQName(*qName("n")), NSNull::null());
+  EXPECT_EQ(_internal(*context).globalForQName(*qName("n")), NSNull::null());
 }
 
 TEST_F(Globals, ConstantsThatDoNotResolveAreSkipped) {
@@ -124,7 +125,7 @@ TEST_F(Globals, InitializerWithoutAValueIsAnUnresolvedVariable) {
 
 TEST_F(Globals, TheEmptySequenceIsAValue) {
   EXPECT_EQ(failure(*prologOf({variable("x", noting("x", NSNull::null()))})), "");
-  EXPECT_EQ(context->_internal().globalForQName(*qName("x")), NSNull::null());
+  EXPECT_EQ(_internal(*context).globalForQName(*qName("x")), NSNull::null());
 }
 
 TEST_F(Globals, ExternalFunctionsAreNeverResolved) {
@@ -143,12 +144,12 @@ TEST_F(Globals, AnInitializerSeesTheStaticContextOfItsModule) {
   const auto library =
       module("m", {XQueryPrologItemOrdered::ordered(false, 0), variable("m:x", look)});
   const auto main = prologOf({import("urn:m")}, modules);
-  context->_internal().setActiveProlog(main.get());
+  _internal(*context).setActiveProlog(main.get());
   evaluate(*main);
   EXPECT_EQ(active, library.get());
   EXPECT_FALSE(ordered);
-  EXPECT_EQ(context->_internal().activeProlog(), main.get());
-  EXPECT_TRUE(context->_internal().ordered());
+  EXPECT_EQ(_internal(*context).activeProlog(), main.get());
+  EXPECT_TRUE(_internal(*context).ordered());
 }
 
 TEST_F(Globals, ImportedVariablesComeBeforeOwnOnes) {

@@ -354,8 +354,8 @@ TEST_F(Embedding, TheClientHearsTraces) {
   const auto client = std::make_shared<Listener>();
   context->contextSetClient(client);
   EXPECT_EQ(context->contextClient(), client);
-  context->_traceValue(XQueryUntypedAtomic("1"), NSString::stringWithASCII("a"));
-  context->_traceValue(XQueryUntypedAtomic("2"), NSString::stringWithASCII("b"));
+  _traceValue(*context, XQueryUntypedAtomic("1"), NSString::stringWithASCII("a"));
+  _traceValue(*context, XQueryUntypedAtomic("2"), NSString::stringWithASCII("b"));
   EXPECT_EQ(client->heard, "a=1;b=2;");
   EXPECT_EQ(client->from, context.get());
 }
@@ -367,12 +367,12 @@ TEST_F(Embedding, TheClientStaysUntilAnotherTakesItsPlace) {
   EXPECT_EQ(strings(evaluate("1")), "1");
   EXPECT_EQ(context->contextClient(), first);
   context->contextSetClient(second);
-  context->_traceValue(XQueryUntypedAtomic("1"), NSString::stringWithASCII("a"));
+  _traceValue(*context, XQueryUntypedAtomic("1"), NSString::stringWithASCII("a"));
   EXPECT_EQ(first->heard, "");
   EXPECT_EQ(second->heard, "a=1;");
   context->contextSetClient(nullptr);
   EXPECT_FALSE(context->contextClient());
-  context->_traceValue(XQueryUntypedAtomic("1"), NSString::stringWithASCII("a"));
+  _traceValue(*context, XQueryUntypedAtomic("1"), NSString::stringWithASCII("a"));
   EXPECT_EQ(second->heard, "a=1;");
 }
 

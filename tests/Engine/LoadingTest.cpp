@@ -25,7 +25,7 @@ using std::chrono::milliseconds;
 
 class Loading : public testing::Test {
  protected:
-  XQueryContextInternal& internal() { return context->_internal(); }
+  XQueryContextInternal& internal() { return _internal(*context); }
   // The document as XML, or "(empty)" when it cannot be had.
   std::string document(const std::string& URL) {
     const Value value = internal().XQueryDocumentForURL(URLOf(URL));

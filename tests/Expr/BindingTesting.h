@@ -10,6 +10,7 @@
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
+#include "xquery/Exception.h"
 
 #include <gtest/gtest.h>
 
@@ -90,7 +91,7 @@ inline Ref<XQueryFLWORExpr> flwor(XQueryFLWORExpr::Clauses clauses, Ref<XQueryEx
 
 class BindingTesting : public testing::Test {
  protected:
-  XQueryContextInternal& dynamic() { return context->_internal(); }
+  XQueryContextInternal& dynamic() { return _internal(*context); }
 
   Ref<XQueryQName> qName(std::string_view name) const {
     return prolog->variableQNameFromString(text(name));

@@ -17,9 +17,9 @@ TEST(BorrowedValue, OfALiteralAndOfTheContextItemIsTheObjectItself) {
   EXPECT_EQ(&*XQueryBorrowedValue(*literal, *context), &literal->literalValue());
   // Without an item there is nothing to borrow.
   EXPECT_FALSE(*XQueryBorrowedValue(*XQueryContextItem::contextItem(), *context));
-  context->_internal().setContextItem(functiontest::integer(8), 1);
+  _internal(*context).setContextItem(functiontest::integer(8), 1);
   EXPECT_EQ(&*XQueryBorrowedValue(*XQueryContextItem::contextItem(), *context),
-            &context->_internal().contextItem());
+            &_internal(*context).contextItem());
 }
 
 // Where the right operand sets what the left one was read from, the left one is what it was.

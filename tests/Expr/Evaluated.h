@@ -9,7 +9,7 @@ namespace xquery {
 // What the expression answers. The error that it meets instead is thrown, as by code that raises.
 inline Value evaluatedOrThrown(const XQueryExpr& expr, XQueryContext& context) {
   Value value = expr.evaluateWithContext(context);
-  if (XQueryHasFailed(value, context)) context._internal().throwFailure();
+  if (XQueryHasFailed(value, context)) _internal(context).throwFailure();
   return value;
 }
 

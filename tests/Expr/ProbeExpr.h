@@ -37,7 +37,7 @@ inline Ref<XQueryExpr> always(Value value) {
 }
 inline Ref<XQueryExpr> failing(int64_t number = 6, std::string message = "invalid type") {
   return probe([=](XQueryContext& context) -> Value {
-    context._internal().raise(XQueryError::error(number, message));
+    _internal(context).raise(XQueryError::error(number, message));
   });
 }
 

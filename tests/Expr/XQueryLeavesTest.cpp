@@ -9,6 +9,7 @@
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryTypeTable.h"
 #include "Types/XQueryValues.h"
+#include "xquery/Exception.h"
 
 #include <gtest/gtest.h>
 
@@ -48,7 +49,7 @@ class BindNote : public XQueryExpr {
 class Leaves : public testing::Test {
  protected:
   Value evaluate(const XQueryExpr& expr) { return evaluatedOrThrown(expr, *context); }
-  XQueryContextInternal& dynamic() { return context->_internal(); }
+  XQueryContextInternal& dynamic() { return _internal(*context); }
   // The error that evaluating raises.
   Ref<XQueryError> failure(const XQueryExpr& expr) {
     try {

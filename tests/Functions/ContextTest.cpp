@@ -8,8 +8,8 @@ using namespace functiontest;
 
 std::string inFocus(XQueryProcedure procedure, int64_t position, int64_t last) {
   return outcome([&](XQueryContext& context) {
-    context._internal().setContextItem(integer(7), position);
-    context._internal().setLast(last);
+    _internal(context).setContextItem(integer(7), position);
+    _internal(context).setLast(last);
     return procedure(nullptr, 0, context);
   });
 }
@@ -34,8 +34,8 @@ TEST(Last, OfZeroIsRefused) {
 
 TEST(PositionAndLast, TakeNoArguments) {
   EXPECT_EQ(outcome([](XQueryContext& context) {
-              context._internal().setContextItem(integer(7), 1);
-              context._internal().setLast(1);
+              _internal(context).setContextItem(integer(7), 1);
+              _internal(context).setLast(1);
               const Value argument = integer(1);
               EXPECT_FALSE(fn_position(&argument, 1, context));
               return fn_last(&argument, 1, context);

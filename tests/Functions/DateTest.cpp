@@ -175,7 +175,7 @@ TEST(Subtract, TakesTwoArguments) {
 
 TEST(Current, AllCallsOfOneContextAgree) {
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
-  const NSInstant& present = context->_internal().currentDateTime()->instant();
+  const NSInstant& present = _internal(*context).currentDateTime()->instant();
   const struct {
     XQueryProcedure procedure;
     XQueryTypeID type;

@@ -95,7 +95,7 @@ TEST(DeepEqual, AnErrorWhileComparingIsFalseAndForgotten) {
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
   const Value arguments[] = {integer(1), string("1")};
   EXPECT_EQ(fn_deep_equal(arguments, 2, *context).get(), NSNumber::falseValue());
-  EXPECT_FALSE(context->_internal().error());
+  EXPECT_FALSE(_internal(*context).error());
 }
 
 TEST(DeepEqual, ANodeEqualsNoAtomicValue) {

@@ -37,7 +37,7 @@ using operatortest::untyped;
 inline std::string call(XQueryProcedure procedure, const std::vector<Value>& arguments,
                         const Value& contextItem = Value()) {
   return outcome([&](XQueryContext& context) {
-    if (contextItem) context._internal().setContextItem(contextItem, 1);
+    if (contextItem) _internal(context).setContextItem(contextItem, 1);
     return procedure(arguments.empty() ? nullptr : arguments.data(), arguments.size(), context);
   });
 }

@@ -101,9 +101,9 @@ TEST(NumberFunction, OfWhatDoesNotCastIsTheSharedNaNAndLeavesNoError) {
   const auto context = XQueryContext::xqueryContext();
   for (const Value& argument :
        {string("x"), months(1), sequence({integer(1), integer(2)}), string("")}) {
-    context->_internal().setError(XQueryErrors::invalidType.error(), false);
+    _internal(*context).setError(XQueryErrors::invalidType.error(), false);
     EXPECT_EQ(fn_number(&argument, 1, *context), XQueryNumber::nan()) << show(argument);
-    EXPECT_FALSE(context->_internal().error());
+    EXPECT_FALSE(_internal(*context).error());
   }
 }
 

@@ -73,7 +73,7 @@ TEST(RegExFunctions, ALoopCompilesItsPatternOnce) {
   const auto context = XQueryContext::xqueryContext();
   Ref<XQueryError> error;
   ASSERT_TRUE(context->evaluateXQuery(*query, {}, Value(), &error));
-  EXPECT_EQ(context->_internal().regExCache()->count(), 2U);
+  EXPECT_EQ(_internal(*context).regExCache()->count(), 2U);
 }
 
 TEST(RegExFunctions, ARunawayPatternIsGivenUpSoon) {

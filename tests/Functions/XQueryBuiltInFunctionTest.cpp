@@ -2,6 +2,7 @@
 #include "Functions/XQueryBuiltInFunction.h"
 #include "Prolog/PrologTesting.h"
 #include "Prolog/XQueryPrologItems.h"
+#include "xquery/Exception.h"
 
 #include <algorithm>
 #include <set>
@@ -156,7 +157,7 @@ Value answered(XQueryProcedure procedure, const std::vector<Value>& arguments,
   try {
     return procedure(arguments.data(), arguments.size(), context);
   } catch (const NSException&) {
-    return context._internal().error();
+    return _internal(context).error();
   }
 }
 
@@ -184,7 +185,7 @@ std::vector<std::vector<Value>> sampleArguments(size_t count) {
 
 TEST(Traits, WhatAnswersTruthAnswersNothingElse) {
   const auto context = XQueryContext::xqueryContext();
-  context->_internal().setContextItem(functiontest::elementFrom("<a xml:lang='a'/>"), 1);
+  _internal(*context).setContextItem(functiontest::elementFrom("<a xml:lang='a'/>"), 1);
   for (const auto& row : XQueryBuiltInFunction::registrations()) {
     if (!row.answersTruth()) continue;
     bool isAnswered = false;
@@ -206,9 +207,9 @@ TEST(Traits, WhatReadsItsArgumentsOnlyAnswersAlikeEverywhere) {
   const auto there = XQueryContext::xqueryContext();
   const auto prolog = prologOf({XQueryPrologItemDefaultElementNamespace::elementNamespace(
       NSString::stringWithASCII("urn:d"), 0)});
-  there->_internal().setActiveProlog(prolog.get());
-  there->_internal().setContextItem(functiontest::elementFrom("<a xml:lang='a'/>"), 3);
-  there->_internal().setLast(5);
+  _internal(*there).setActiveProlog(prolog.get());
+  _internal(*there).setContextItem(functiontest::elementFrom("<a xml:lang='a'/>"), 3);
+  _internal(*there).setLast(5);
   const auto shown = [](const Value& value) {
     const auto* name = dyn_cast<XQueryQName>(value);
     return name ? name->description()->utf8() : functiontest::show(value);

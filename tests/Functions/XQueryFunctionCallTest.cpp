@@ -8,6 +8,7 @@
 #include "Functions/XQueryFunctionCall.h"
 #include "Platform/Base/StackTestSupport.h"
 #include "Prolog/PrologTesting.h"
+#include "xquery/Exception.h"
 
 #include <algorithm>
 #include <functional>
@@ -39,7 +40,7 @@ Ref<ActingExpr> giving(Value value) {
 }
 Ref<ActingExpr> raising(std::string_view message) {
   return acting([message = std::string(message)](XQueryContext& context) -> Value {
-    context._internal().raise(XQueryError::error(6, message));
+    _internal(context).raise(XQueryError::error(6, message));
   });
 }
 Value integer(int64_t value) {
@@ -73,7 +74,7 @@ class FunctionCall : public testing::Test {
     return evaluated(*call);
   }
   Ref<XQueryContext> context = XQueryContext::xqueryContext();
-  XQueryContextInternal& dynamic = context->_internal();
+  XQueryContextInternal& dynamic = _internal(*context);
 };
 
 // --- binding -------------------------------------------------------------------------------------

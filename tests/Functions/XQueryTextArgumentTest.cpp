@@ -43,7 +43,7 @@ TEST(TextArgument, WithoutArgumentsTheContextItemIsTheArgument) {
   const Value given = string("given");
   EXPECT_FALSE(XQueryArgumentOrContextItem(nullptr, 0, *context));
   const Value item = string("item");
-  context->_internal().setContextItem(item, 1);
+  _internal(*context).setContextItem(item, 1);
   EXPECT_EQ(XQueryArgumentOrContextItem(nullptr, 0, *context), item);
   EXPECT_EQ(XQueryArgumentOrContextItem(&given, 1, *context), given);
   EXPECT_FALSE(XQueryArgumentOrContextItem(&given, 2, *context));

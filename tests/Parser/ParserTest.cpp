@@ -4,6 +4,7 @@
 #include "Parser/XQueryTokens.h"
 #include "Platform/Base/ProcessorTime.h"
 #include "Platform/Text/TextTestSupport.h"
+#include "xquery/Exception.h"
 
 #include <gtest/gtest.h>
 

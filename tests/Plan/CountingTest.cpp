@@ -338,9 +338,9 @@ TEST(Counting, EndsEarlyWhereNobodyCanTell) {
   const auto query =
       compiled("exists(for $i in //i, $j in $i/../i, $k in $j/../i return $k)", XQueryWay::Planned);
   const auto context = XQueryContext::xqueryContext();
-  context->_internal().setContextItem(items(), 1);
+  _internal(*context).setContextItem(items(), 1);
   const int64_t before = workMeter.stepsLeft;
-  EXPECT_TRUE(query->_internal().body()->evaluateWithContext(*context));
+  EXPECT_TRUE(_internal(*query).body()->evaluateWithContext(*context));
   EXPECT_LT(before - workMeter.stepsLeft, 200);
 }
 
@@ -358,11 +358,11 @@ TEST(Counting, TakesNumbersFromTheIndex) {
         std::pair("count(//none)", "0"), std::pair("count(//e) > 19999", "true")}) {
     const auto planned = compiled(query, XQueryWay::Planned);
     const auto context = XQueryContext::xqueryContext();
-    context->_internal().setContextItem(many, 1);
+    _internal(*context).setContextItem(many, 1);
     int64_t steps = 0;
     for (int turn = 0; turn < 4; ++turn) {
       const int64_t before = workMeter.stepsLeft;
-      const Value value = planned->_internal().body()->evaluateWithContext(*context);
+      const Value value = _internal(*planned).body()->evaluateWithContext(*context);
       steps = before - workMeter.stepsLeft;
       ASSERT_TRUE(value);
       EXPECT_EQ(XQueryItemStringValue(*value), expected) << query;

@@ -110,7 +110,7 @@ std::vector<std::string> notesOn(std::string_view rule, const std::string& query
                                  bool areRefusals) {
   std::vector<std::string> texts;
   const auto explained = compiled(query, XQueryWay::Explained);
-  const auto plan = explained->_internal().planReport();
+  const auto plan = _internal(*explained).planReport();
   if (!plan) return texts;
   for (const auto& entry : plan->entries()) {
     for (const auto& note : entry.notes) {

@@ -108,7 +108,7 @@ class CheckedExpr : public XQueryPlannedExpr {
       : XQueryPlannedExpr(std::move(plain)), _facts(facts) {}
 
   Value computeValue(XQueryContext& context) const override {
-    auto& dynamic = context._internal();
+    auto& dynamic = _internal(context);
     const Value contextItem = dynamic.contextItem();
     const int64_t position = dynamic.position();
     std::vector<Value> variables;
@@ -165,7 +165,7 @@ TEST(GeneratedPrograms, ContradictNoFact) {
   size_t values = 0;
   const unsigned programs = forEachProgram([&](const std::string& text, const Value& contextItem) {
     const auto query = compiled(text);
-    auto& internal = query->_internal();
+    auto& internal = _internal(*query);
     const auto body =
         XQueryPlanned(*internal.prolog(), Ref<XQueryExpr>(internal.body()), std::span(&rule, 1));
     const auto checked =
@@ -186,7 +186,7 @@ TEST(GeneratedPrograms, AnswerTheSamePlannedAndPlain) {
   size_t values = 0;
   const unsigned programs = forEachProgram([&](const std::string& text, const Value& contextItem) {
     const auto planned = compiled(text, XQueryWay::Planned);
-    operators += OperatorList(*planned->_internal().body()).operators.size();
+    operators += OperatorList(*_internal(*planned).body()).operators.size();
     const Outcome plain = outcomeOf(*compiled(text), contextItem, {}, limits(plainDuration));
     if (endedAtLimit(plain)) return;
     EXPECT_EQ(plain.lines, outcomeOf(*planned, contextItem, {}, limits(plannedDuration)).lines);

@@ -1,6 +1,7 @@
 // Elements that are found by a value in the index of the tree, and that nobody can tell.
 #include "Expr/RandomChoices.h"
 #include "Plan/PlanTesting.h"
+#include "Platform/Tree/Names.h"
 #include "Platform/Tree/TreeIndexes.h"
 
 #include <string>

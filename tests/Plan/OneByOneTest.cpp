@@ -73,11 +73,11 @@ TEST(OneByOne, IsNotTakenWhereThatCouldBeToldOrIsOfNoUse) {
 int64_t stepsOf(std::string_view text, const Value& contextItem) {
   const auto query = compiled(text, XQueryWay::Planned);
   const auto context = XQueryContext::xqueryContext();
-  context->_internal().setContextItem(contextItem, 1);
+  _internal(*context).setContextItem(contextItem, 1);
   int64_t steps = 0;
   for (int turn = 0; turn < 4; ++turn) {
     const int64_t before = workMeter.stepsLeft;
-    EXPECT_TRUE(query->_internal().body()->evaluateWithContext(*context)) << text;
+    EXPECT_TRUE(_internal(*query).body()->evaluateWithContext(*context)) << text;
     steps = before - workMeter.stepsLeft;
   }
   return steps;

@@ -49,7 +49,7 @@ inline Outcome outcomeIn(XQueryContext& context, const XQuery& query, const Valu
       outcome.lines.push_back(std::move(line));
     }
   }
-  const auto& left = context._internal();
+  const auto& left = _internal(context);
   if (left.contextItem()) {
     outcome.lines.push_back("left " + shownItem(*left.contextItem()) + " at " +
                             std::to_string(left.position()) + " of " + std::to_string(left.last()));

@@ -29,7 +29,7 @@ inline Ref<XQuery> compiled(std::string_view text, XQueryWay way = XQueryWay::Pl
 }
 
 inline XQueryProgram programOf(const XQuery& query) {
-  return XQueryProgram(*query._internal().prolog(), Ref<XQueryExpr>(query._internal().body()));
+  return XQueryProgram(*_internal(query).prolog(), Ref<XQueryExpr>(_internal(query).body()));
 }
 
 inline std::string joined(const std::vector<std::string>& words, const char* separator) {
@@ -108,7 +108,7 @@ template <class IsCounted>
 size_t choicesIn(std::string_view text, IsCounted isCounted) {
   const auto query = compiled(text, XQueryWay::Explained);
   size_t count = 0;
-  for (const auto& entry : query->_internal().planReport()->entries()) {
+  for (const auto& entry : _internal(*query).planReport()->entries()) {
     for (const auto& note : entry.notes) count += !note.isRefusal && isCounted(note.rule) ? 1 : 0;
   }
   return count;

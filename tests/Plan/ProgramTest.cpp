@@ -220,7 +220,7 @@ TEST(Program, KnowsWhereResultsAreSorted) {
 // Nesting is a matter of memory here, not of the stack.
 TEST(Program, ListsWhatIsDeeplyNested) {
   const auto path = compiled("//a");
-  Ref<XQueryExpr> expr(path->_internal().body());
+  Ref<XQueryExpr> expr(_internal(*path).body());
   constexpr int depth = 50'000;
   for (int i = 0; i < depth; ++i) {
     auto list = XQueryExprList::exprList();
@@ -228,11 +228,11 @@ TEST(Program, ListsWhatIsDeeplyNested) {
     expr = list;
   }
   const auto query = compiled("1");
-  XQueryProgram program(*query->_internal().prolog(), expr);
+  XQueryProgram program(*_internal(*query).prolog(), expr);
   EXPECT_GT(program.placeCount(), depth + 1U);
   const XQueryFactTable facts(program);
   EXPECT_EQ(shownItems(facts[0]), "* element in order");
-  EXPECT_TRUE(XQueryPlanned(*query->_internal().prolog(), expr));
+  EXPECT_TRUE(XQueryPlanned(*_internal(*query).prolog(), expr));
 }
 
 }  // namespace

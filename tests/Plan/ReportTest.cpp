@@ -17,7 +17,7 @@ using testing::HasSubstr;
 using testing::Not;
 
 std::vector<XQueryPlanReport::Entry> entriesOf(std::string_view text) {
-  return compiled(text, XQueryWay::Explained)->_internal().planReport()->entries();
+  return _internal(*compiled(text, XQueryWay::Explained)).planReport()->entries();
 }
 
 // "depth label".
@@ -151,7 +151,7 @@ TEST(PlanReport, ThePlanThatIsShownIsTheOneThatIsEvaluated) {
   const auto planned = compiled(text, XQueryWay::Planned);
   const auto explained = compiled(text, XQueryWay::Explained);
   const auto count = [](const XQuery& query) {
-    return OperatorList(*query._internal().body()).operators.size();
+    return OperatorList(*_internal(query).body()).operators.size();
   };
   EXPECT_GT(count(*planned), 0U);
   EXPECT_EQ(count(*planned), count(*explained));

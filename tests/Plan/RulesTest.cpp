@@ -21,13 +21,13 @@ TEST(Rules, HaveNamesOfTheirOwn) {
 
 TEST(Switch, OfTheCallLeavesTheQueryAsItIsWritten) {
   const auto plain = compiled("for $i in 1 to 3 return count(//a)", XQueryWay::Plain);
-  EXPECT_TRUE(OperatorList(*plain->_internal().body()).operators.empty());
+  EXPECT_TRUE(OperatorList(*_internal(*plain).body()).operators.empty());
 }
 
 TEST(Switch, OfTheEnvironmentLeavesTheQueryAsItIsWritten) {
   const auto operators = [] {
     const auto query = compiled("for $i in 1 to 3 return count(//a)", XQueryWay::Planned);
-    return OperatorList(*query->_internal().body()).operators.size();
+    return OperatorList(*_internal(*query).body()).operators.size();
   };
   ::setenv("XQUERY_PLAN", "0", 1);
   const size_t without = operators();

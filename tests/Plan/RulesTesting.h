@@ -34,7 +34,7 @@ inline size_t operatorsOf(std::string_view rule, std::string_view text) {
   }
   EXPECT_EQ(rules.size(), 3U) << rule;
   const auto query = compiled(text);
-  const auto& internal = query->_internal();
+  const auto& internal = _internal(*query);
   const auto planned = XQueryPlanned(*internal.prolog(), Ref<XQueryExpr>(internal.body()), rules);
   return OperatorList(*planned).operators.size();
 }
@@ -85,10 +85,10 @@ inline const Value& manyNames() {
 inline int64_t stepsOf(const char* text) {
   const auto query = compiled(text, XQueryWay::Planned);
   const auto context = XQueryContext::xqueryContext();
-  context->_internal().setContextItem(manyNames(), 1);
-  (void)query->_internal().body()->evaluateWithContext(*context);  // has the tree indexed
+  _internal(*context).setContextItem(manyNames(), 1);
+  (void)_internal(*query).body()->evaluateWithContext(*context);  // has the tree indexed
   const int64_t before = workMeter.stepsLeft;
-  (void)query->_internal().body()->evaluateWithContext(*context);
+  (void)_internal(*query).body()->evaluateWithContext(*context);
   return before - workMeter.stepsLeft;
 }
 

@@ -7,6 +7,7 @@
 #include "Types/XQueryValues.h"
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
+#include "xquery/Exception.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
 #include "xquery/XQuery.h"
@@ -69,12 +70,12 @@ inline Ref<NSXMLDocument> parse(std::string_view xml) {
 // Calls what must raise; the answer is "number message", or "no error".
 template <class Function>
 std::string raised(XQueryContext& context, Function function) {
-  context._internal().setError(nullptr, false);
+  _internal(context).setError(nullptr, false);
   try {
     function();
   } catch (const NSException& exception) {
     EXPECT_EQ(exception.name(), "XQueryError");
-    const Ref<XQueryError>& error = context._internal().error();
+    const Ref<XQueryError>& error = _internal(context).error();
     if (!error) return "exception without a record";
     return std::to_string(error->err()) + " " + utf8(error->msg());
   }

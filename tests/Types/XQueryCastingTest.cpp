@@ -229,9 +229,9 @@ class CastingToQName : public Casting {
  protected:
   void SetUp() override {
     prolog->addPrefix(text("p"), text("urn:p"));
-    context->_internal().setActiveProlog(prolog.get());
+    _internal(*context).setActiveProlog(prolog.get());
   }
-  void TearDown() override { context->_internal().setActiveProlog(nullptr); }
+  void TearDown() override { _internal(*context).setActiveProlog(nullptr); }
   std::string qName(const char* name) {
     const Value value = castAs(text(name), 15);
     return utf8(cast<XQueryQName>(value)->description());

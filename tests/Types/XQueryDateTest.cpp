@@ -347,10 +347,10 @@ TEST(XQueryDate, ThePresentIsInTheLocalZone) {
 
 TEST(XQueryDate, TheContextKeepsItsFirstPresent) {
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
-  const Ref<XQueryDate> first = context->_internal().currentDateTime();
+  const Ref<XQueryDate> first = _internal(*context).currentDateTime();
   EXPECT_EQ(first->typeID(), 21);
-  EXPECT_EQ(context->_internal().currentDateTime(), first);
-  EXPECT_NE(XQueryContext::xqueryContext()->_internal().currentDateTime(), first);
+  EXPECT_EQ(_internal(*context).currentDateTime(), first);
+  EXPECT_NE(_internal(*XQueryContext::xqueryContext()).currentDateTime(), first);
 }
 
 TEST(XQueryDate, EqualityIsThatOfTheInstants) {

@@ -24,6 +24,7 @@
 #include "Platform/Reading/UnpackedInput.h"
 #include "Platform/Reading/XMLRecords.h"
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/Stream.h"
 
@@ -87,7 +88,7 @@ class Stream {
          const XQueryContext::StreamReceiver& receive, XQueryStreamFailure& failure)
       : _program(program),
         _context(context),
-        _internal(context._internal()),
+        _internal(xquery::_internal(context)),
         _input(input),
         _receive(receive),
         _failure(failure) {}
@@ -189,7 +190,7 @@ bool XQueryContext::evaluateStream(const XQuery& query, const XQueryConstants& c
                                    const XQueryStreamInput& input, const StreamReceiver& receive,
                                    XQueryStreamFailure& failure) {
   failure = {};
-  const XQueryInternal& compiled = query._internal();
+  const XQueryInternal& compiled = _internal(query);
   if (compiled.isError()) {
     failure.error = compiled.errors().front();
     return false;
@@ -199,6 +200,7 @@ bool XQueryContext::evaluateStream(const XQuery& query, const XQueryConstants& c
     failure.error = XQueryErrors::notAStream.error("it was not compiled to be");
     return false;
   }
+  const XQueryContextInternal::UnderWay underWay(*_private);
   const NSXMLEra era;
   beginEvaluation(compiled);
   Stream stream(*program, *this, input, receive, failure);
@@ -214,7 +216,7 @@ bool XQueryContext::evaluateStream(const XQuery& query, const XQueryConstants& c
 }
 
 std::string XQueryStreamDescription(const XQuery& query) {
-  const XQueryStreamProgram* const program = query._internal().streamProgram();
+  const XQueryStreamProgram* const program = _internal(query).streamProgram();
   return program ? program->description : std::string();
 }
 

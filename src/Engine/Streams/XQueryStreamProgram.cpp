@@ -17,7 +17,7 @@ namespace {
 Ref<XQueryError> refusalOf(const XQueryProgram& program, const XQueryStreamPlan& plan,
                            const XQueryProlog& main) {
   const XQueryExpr& expr = *program[plan.refusedAt].expr;
-  const auto error = XQueryError::_errorWithTrace(
+  const auto error = XQueryErrorTrace::error(
       *XQueryErrors::notAStream.errorAtLine(expr.exprLine(), plan.reason),
       XQueryErrorTrace::traceInPlaces(main.modules().places(), expr.exprPlace()));
   const XQueryProlog* prolog = program.bodyOf(plan.refusedAt).prolog;

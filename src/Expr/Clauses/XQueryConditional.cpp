@@ -44,14 +44,14 @@ Value XQueryConditionalExpr::computeValue(XQueryContext& context) const {
     }
   }
   Value value = XQueryEvaluateOrEmpty(branch, context);
-  if (value || context._internal().isFailing()) return value;
+  if (value || _internal(context).isFailing()) return value;
   return failConversion(context);
 }
 
 // Out of line: what it needs of the stack is no part of a recursion's frames.
 Value XQueryConditionalExpr::failConversion(XQueryContext& context) const {
-  return context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()),
-                                  exprPlace());
+  return _internal(context).fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()),
+                                 exprPlace());
 }
 
 }  // namespace xquery

@@ -131,8 +131,8 @@ void XQueryFLWORExpr::visitParts(XQueryPartVisitor& visitor) {
 bool XQueryFLWORExpr::isOfType(const XQueryBindingExpr& clause, const NSObject* value,
                                XQueryContext& context) const {
   if (!clause.type() || XQueryInstanceOf(value, *clause.type(), &context)) return true;
-  context._internal().fail(XQueryErrors::invalidType.errorAtLine(clause.exprLine()),
-                           clause.exprPlace());
+  _internal(context).fail(XQueryErrors::invalidType.errorAtLine(clause.exprLine()),
+                          clause.exprPlace());
   return false;
 }
 
@@ -147,7 +147,7 @@ bool XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toRe
     Value value = binding.evaluateWithContext(withContext);
     if (XQueryHasFailed(value, withContext)) return false;
     if (!isOfType(binding, value.get(), withContext)) return false;
-    withContext._internal().setVariable(std::move(value), binding.varID());
+    _internal(withContext).setVariable(std::move(value), binding.varID());
   }
   return _forLet.empty() || processItem(toResults, withContext);
 }
@@ -217,7 +217,7 @@ bool XQueryFLWORExpr::evaluateGiven(const XQueryForExpr& clause, size_t index,
 // `position` counts from 0.
 void XQueryFLWORExpr::setTuple(const XQueryForExpr& clause, Value item, size_t position,
                                XQueryContext& context) {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   dynamic.setVariable(std::move(item), clause.varID());
   if (!clause.posVarID()) return;
   dynamic.setVariable(NSNumber::numberWithLongLong(static_cast<int64_t>(position) + 1),
@@ -348,7 +348,7 @@ Value XQueryFLWORExpr::firstItems(uint64_t most, XQueryContext& context) const {
   if (!XQueryFLWORSortFirst(results.sortList, first.ascending(), first.emptyLeast(), most)) {
     // Of several keys it is not known which.
     const XQueryPlaceNumber at = _orderSpecs.size() == 1 ? first.exprPlace() : exprPlace();
-    return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()), at);
+    return _internal(context).fail(XQueryErrors::invalidType.errorAtLine(exprLine()), at);
   }
   auto sorted = XQuerySequence::sequence();
   sorted->objects().reserve(results.sortList.items.size());
@@ -376,7 +376,7 @@ void XQueryOrderExpr::visitParts(XQueryPartVisitor& visitor) {
 
 Value XQueryOrderExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const bool saved = dynamic.ordered();
   dynamic.setOrdered(_ordered);
   Value value = XQueryEvaluateOrEmpty(_expr.get(), context);

@@ -51,8 +51,8 @@ void XQueryQuantifiedExpr::visitParts(XQueryPartVisitor& visitor) {
 
 Value XQueryQuantifiedExpr::computeValue(XQueryContext& context) const {
   Value answer = evaluatePostion(0, context);
-  if (answer || context._internal().isFailing()) return answer;
-  return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()), exprPlace());
+  if (answer || _internal(context).isFailing()) return answer;
+  return _internal(context).fail(XQueryErrors::invalidType.errorAtLine(exprLine()), exprPlace());
 }
 
 Value XQueryQuantifiedExpr::evaluatePostion(size_t index, XQueryContext& withContext) const {
@@ -66,7 +66,7 @@ Value XQueryQuantifiedExpr::evaluatePostion(size_t index, XQueryContext& withCon
   // the clause after this one.
   for (size_t clause = index; clause < _items.size(); ++clause) {
     Value answer = evaluateItems(clause, index, withContext);
-    if (answer || withContext._internal().isFailing()) return answer;
+    if (answer || _internal(withContext).isFailing()) return answer;
   }
   return undecided();
 }
@@ -99,9 +99,9 @@ Value XQueryQuantifiedExpr::evaluateItem(size_t clause, size_t index, Value item
   const XQueryQuantifiedExprItem& binding = *_items[clause];
   if (binding.type() && !XQueryInstanceOf(item.get(), *binding.type(), &context)) {
     const auto error = XQueryErrors::invalidType.errorAtLine(binding.exprLine());
-    return context._internal().placed(error, binding.exprPlace());
+    return _internal(context).placed(error, binding.exprPlace());
   }
-  context._internal().setVariable(std::move(item), binding.varID());
+  _internal(context).setVariable(std::move(item), binding.varID());
   return evaluatePostion(index + 1, context);
 }
 
@@ -141,12 +141,12 @@ Value XQueryQuantifiedExpr::evaluatePicks(size_t clause, const XQueryPicks& pick
   const Value open = undecided();
   for (const XQueryPick& pick : picks.chosen) {
     checkWork();
-    context._internal().setVariable((*picks.items)[pick.position], varID);
+    _internal(context).setVariable((*picks.items)[pick.position], varID);
     if (pick.isSure && isLast) return NSNumber::numberWithBool(!_every);
     Value answer = evaluatePostion(clause + 1, context);
     if (answer != open) return answer;
   }
-  context._internal().setVariable(picks.items->back(), varID);
+  _internal(context).setVariable(picks.items->back(), varID);
   return open;
 }
 

@@ -25,7 +25,7 @@ NSXMLNameRef attributeName(const XQueryConstructorName& expr, XQueryContext& con
                            int64_t line) {
   NSXMLNameRef name = expr.evaluate(context, line);
   if (name && isDeclarationName(*name.get())) {
-    context._internal().raise(XQueryErrors::attributeIsXMLNS.errorAtLine(line));
+    _internal(context).raise(XQueryErrors::attributeIsXMLNS.errorAtLine(line));
   }
   return name;
 }

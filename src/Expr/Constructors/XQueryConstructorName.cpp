@@ -109,7 +109,7 @@ void XQueryConstructorName::visitParts(XQueryPartVisitor& visitor) {
 
 bool XQueryConstructorName::isConstantIn(XQueryContext& context) const {
   return _constant &&
-         (!_waitsForContext || !context._internal().contextNamespaceForPrefix(NSStringView()));
+         (!_waitsForContext || !_internal(context).contextNamespaceForPrefix(NSStringView()));
 }
 
 NSXMLNameRef XQueryConstructorName::evaluate(XQueryContext& context, int64_t line) const {
@@ -117,14 +117,14 @@ NSXMLNameRef XQueryConstructorName::evaluate(XQueryContext& context, int64_t lin
   const Value value = _nameExpr ? _nameExpr->evaluateWithContext(context) : Value();
   if (XQueryHasFailed(value, context)) return {};
   if (!value) {
-    context._internal().raise(XQueryErrors::unresolvedQName.errorAtLine(line, _name));
+    _internal(context).raise(XQueryErrors::unresolvedQName.errorAtLine(line, _name));
   }
   const Value item =
       XQueryAtomizationCheckingOccurrence(value, XQueryOccurrenceExactlyOne, context);
   const Value name = XQueryCastAs(item, XQueryTypeQName, context);
   const auto* qName = dyn_cast<XQueryQName>(name);
   if (!qName || !mayBeNodeName(*qName, _nodeKind)) {
-    context._internal().raise(XQueryErrors::invalidType.errorAtLine(line));
+    _internal(context).raise(XQueryErrors::invalidType.errorAtLine(line));
   }
   return nodeName(*qName);
 }

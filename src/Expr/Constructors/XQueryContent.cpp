@@ -39,11 +39,11 @@ void XQueryContent::addItem(NSObject* item) {
   if (auto* node = dyn_cast<NSXMLNode>(item)) {
     addNode(*node);
   } else if (const auto* run = dyn_cast<XQueryElementContentString>(item)) {
-    if (run->isXMLSpace() && !_context._internal().xmlSpacePreserve()) return;
+    if (run->isXMLSpace() && !_internal(_context).xmlSpacePreserve()) return;
     appendText(run->view());
     noteContent();
   } else if (auto* error = dyn_cast<XQueryError>(item)) {
-    _context._internal().raise(error);
+    _internal(_context).raise(error);
   } else if (XQueryIsAtomicType(item)) {
     if (followsAtomic) _text.append(u' ');
     XQueryAppendAtomic(item, _text, _context);
@@ -114,8 +114,8 @@ XQueryElementContent::XQueryElementContent(NSXMLElement& element, const NSXMLRoo
                                            XQueryContext& context, int64_t line)
     : XQueryContent(element, context, line),
       _namespaces(namespaces),
-      _inheritNamespaces(!context._internal().activeProlog() ||
-                         context._internal().activeProlog()->inheritNamespaces()) {
+      _inheritNamespaces(!_internal(context).activeProlog() ||
+                         _internal(context).activeProlog()->inheritNamespaces()) {
   setRoom(room);
 }
 
@@ -149,7 +149,7 @@ bool XQueryElementContent::isNewName(const NSXMLExpandedName* name) {
 // One without a prefix has nothing to declare: the default namespace is none of attributes.
 void XQueryElementContent::prepareForAttribute(const NSXMLName& name) {
   if (!isNewName(name.expanded)) {
-    _context._internal().raise(XQueryErrors::attributeNotDistinct.errorAtLine(_line));
+    _internal(_context).raise(XQueryErrors::attributeNotDistinct.errorAtLine(_line));
   }
   if (name.prefixLength > 0) _namespaces.updateNamespacesForElement(element(), name);
 }
@@ -176,7 +176,7 @@ void XQueryElementContent::addNewAttribute(NSXMLNameRef name, NSStringView text)
 // --- documents -----------------------------------------------------------------------------------
 
 void XQueryDocumentContent::refuse() {
-  _context._internal().raise(XQueryErrors::invalidDocumentNode.errorAtLine(_line));
+  _internal(_context).raise(XQueryErrors::invalidDocumentNode.errorAtLine(_line));
 }
 
 void XQueryDocumentContent::addElement(NSXMLElement& element) {

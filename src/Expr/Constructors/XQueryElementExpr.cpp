@@ -102,7 +102,7 @@ void XQueryElementExpr::visitParts(XQueryPartVisitor& visitor) {
 
 Value XQueryElementExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   XQueryInScopeNamespaces namespaces(dynamic);
   if (!_namespaces.empty()) {
     for (const auto& declaration : _namespaces) NSXMLCredit::take(declaration.get());

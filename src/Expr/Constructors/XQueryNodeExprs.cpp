@@ -69,8 +69,7 @@ Value XQueryCommentExpr::computeValue(XQueryContext& context) const {
   NSMutableString text;
   if (appendTextOf(_value, text, context) == Part::Failed) return {};
   if (const Ref<NSXMLNode> comment = XQueryXMLNodeComment(*text.string())) return comment;
-  return context._internal().fail(XQueryErrors::invalidComment.errorAtLine(exprLine()),
-                                  exprPlace());
+  return _internal(context).fail(XQueryErrors::invalidComment.errorAtLine(exprLine()), exprPlace());
 }
 
 // --- processing instructions ---------------------------------------------------------------------
@@ -102,7 +101,7 @@ void XQueryProcessingInstructionExpr::visitParts(XQueryPartVisitor& visitor) {
 
 Value XQueryProcessingInstructionExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const NSXMLNameRef name = _name.evaluate(context, exprLine());
   if (!name) return {};
   NSMutableString content;
@@ -131,7 +130,7 @@ void XQueryDocumentExpr::bindInfoForProlog(XQueryProlog& prolog) {
 
 Value XQueryDocumentExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const Ref<NSXMLDocument> document = NSXMLDocument::document();
   dynamic.setBaseURI(dynamic.baseURI(), document.get());
   XQueryDocumentContent content(*document, context, exprLine());
@@ -165,8 +164,8 @@ void XQueryNamespaceExpr::visitParts(XQueryPartVisitor& visitor) {
 
 Value XQueryNamespaceExpr::computeValue(XQueryContext& context) const {
   if (_name->view() == "xml" || _name->view() == "xmlns") {
-    return context._internal().fail(XQueryErrors::invalidNamespace.errorAtLine(exprLine()),
-                                    exprPlace());
+    return _internal(context).fail(XQueryErrors::invalidNamespace.errorAtLine(exprLine()),
+                                   exprPlace());
   }
   NSMutableString URI;
   if (appendTextOf(_value, URI, context) == Part::Failed) return {};

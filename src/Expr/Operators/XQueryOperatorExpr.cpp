@@ -219,7 +219,7 @@ Value XQueryOperatorExpr::answerFor(const Value& left, const Value& right,
   }
   Value answer = isSign() ? XQueryUnarySign(_type, right, context)
                           : dispatch(_type, leftOrEmpty(left), right, context);
-  if (isFailure(answer)) return context._internal().fail(errorFor(answer, _line), exprPlace());
+  if (isFailure(answer)) return _internal(context).fail(errorFor(answer, _line), exprPlace());
   return answer;
 }
 
@@ -246,7 +246,7 @@ XQueryRangeBounds XQueryOperatorExpr::rangeBounds(XQueryContext& context) const 
     if (XQueryHasFailed(end, context)) return {};
     XQueryRangeBounds bounds = XQueryRangeBoundsFrom(leftOrEmpty(start), end, context);
     if (!bounds.areIntegers && isFailure(bounds.answer)) {
-      bounds.answer = context._internal().fail(errorFor(bounds.answer, _line), exprPlace());
+      bounds.answer = _internal(context).fail(errorFor(bounds.answer, _line), exprPlace());
     }
     return bounds;
   });
@@ -277,7 +277,7 @@ int XQueryOperatorExpr::operatorClassification(int type) {
 Value XQueryOperatorExpr::evaluateOperator(int type, const Value& withLeft, const Value& right,
                                            XQueryContext& forContext) {
   Value answer = dispatch(type, withLeft, right, forContext);
-  if (isFailure(answer)) forContext._internal().raise(errorFor(answer, -1));
+  if (isFailure(answer)) _internal(forContext).raise(errorFor(answer, -1));
   return answer;
 }
 

@@ -40,7 +40,7 @@ uint64_t mostRangeItems() {
 }
 
 [[noreturn]] void raiseRangeTooLong(XQueryContext& context, XQueryPlaceNumber at = 0) {
-  XQueryContextInternal& dynamic = context._internal();
+  XQueryContextInternal& dynamic = _internal(context);
   if (at != 0) dynamic.raise(XQueryErrors::rangeTooLong.error(), at);
   dynamic.raise(XQueryErrors::rangeTooLong.error());
 }

@@ -4,6 +4,7 @@
 #include "Expr/Paths/NodeOrder.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/TreeHead.h"
 #include "xquery/Collection.h"
 
 #include <vector>
@@ -67,8 +68,8 @@ bool areInOrder(const Nodes& nodes) {
   for (const NSObject* each : nodes) {
     pacer.turn();
     const auto* node = cast<NSXMLNode>(each);
-    if (previous && !(NSXMLNode::haveComparableOrder(previous, node) &&
-                      previous->orderNumber() < node->orderNumber())) {
+    if (previous && !(NSXMLNodeOrder::areComparable(previous, node) &&
+                      NSXMLNodeOrder::number(*previous) < NSXMLNodeOrder::number(*node))) {
       return false;
     }
     previous = node;
@@ -78,8 +79,8 @@ bool areInOrder(const Nodes& nodes) {
 
 bool areOfOneTree(const Nodes& left, const Nodes& right) {
   return left.empty() || right.empty() ||
-         NSXMLNode::haveComparableOrder(cast<NSXMLNode>(left.front()),
-                                        cast<NSXMLNode>(right.front()));
+         NSXMLNodeOrder::areComparable(cast<NSXMLNode>(left.front()),
+                                       cast<NSXMLNode>(right.front()));
 }
 
 // The same for nodes in order, whose result is in order without being sorted.
@@ -89,7 +90,9 @@ std::vector<Value> merge(int type, const Nodes& left, const Nodes& right) {
   const bool takesLeft = type != XQueryOperatorIntersect;
   std::vector<Value> result;
   WorkPacer pacer;
-  const auto numberOf = [](const NSObject* node) { return cast<NSXMLNode>(node)->orderNumber(); };
+  const auto numberOf = [](const NSObject* node) {
+    return NSXMLNodeOrder::number(*cast<NSXMLNode>(node));
+  };
   size_t index = 0;
   const auto takeRightBefore = [&](uint32_t number) {
     for (; index < right.size() && numberOf(right[index]) < number; ++index) {

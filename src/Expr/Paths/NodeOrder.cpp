@@ -16,6 +16,7 @@
 
 #include "Expr/Clauses/StableMergeSort.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/TreeHead.h"
 #include "xquery/Number.h"
 
 #include <algorithm>
@@ -78,7 +79,7 @@ bool allComparable(const std::vector<Value>& nodes) {
   WorkPacer pacer;
   for (size_t i = 1; i < nodes.size(); ++i) {
     pacer.turn();
-    if (!NSXMLNode::haveComparableOrder(nodeOf(nodes[i - 1]), nodeOf(nodes[i]))) return false;
+    if (!NSXMLNodeOrder::areComparable(nodeOf(nodes[i - 1]), nodeOf(nodes[i]))) return false;
   }
   return true;
 }
@@ -101,10 +102,10 @@ std::vector<Placed> placedNodes(std::vector<Value>& nodes) {
   for (Value& value : nodes) {
     pacer.turn();
     const NSXMLNode* node = nodeOf(value);
-    const bool inSameTree = previous && NSXMLNode::haveComparableOrder(previous, node);
+    const bool inSameTree = previous && NSXMLNodeOrder::areComparable(previous, node);
     const NSXMLNode* root = inSameTree ? placed.back().root : node->rootNode();
-    (void)NSXMLNode::haveComparableOrder(node, node);  // makes the number good
-    placed.push_back({std::move(value), root, node->orderNumber(), placed.size()});
+    (void)NSXMLNodeOrder::areComparable(node, node);  // makes the number good
+    placed.push_back({std::move(value), root, NSXMLNodeOrder::number(*node), placed.size()});
     previous = node;
   }
   return placed;
@@ -131,7 +132,7 @@ void sortByOrderNumber(std::vector<Value>& nodes) {
   WorkPacer pacer;
   for (Value& node : nodes) {
     pacer.turn();
-    const uint32_t number = nodeOf(node)->orderNumber();
+    const uint32_t number = NSXMLNodeOrder::number(*nodeOf(node));
     numbered.push_back({number, std::move(node)});
   }
   std::sort(numbered.begin(), numbered.end(), [&pacer](const Numbered& a, const Numbered& b) {
@@ -165,12 +166,14 @@ bool XQueryNodeAfterByClimbing(const NSXMLNode* a, const NSXMLNode* b) {
 }
 
 bool XQueryNodeBefore(const NSXMLNode* a, const NSXMLNode* b) {
-  if (NSXMLNode::haveComparableOrder(a, b)) return a->orderNumber() < b->orderNumber();
+  if (NSXMLNodeOrder::areComparable(a, b))
+    return NSXMLNodeOrder::number(*a) < NSXMLNodeOrder::number(*b);
   return XQueryNodeBeforeByClimbing(a, b);
 }
 
 bool XQueryNodeAfter(const NSXMLNode* a, const NSXMLNode* b) {
-  if (NSXMLNode::haveComparableOrder(a, b)) return a->orderNumber() > b->orderNumber();
+  if (NSXMLNodeOrder::areComparable(a, b))
+    return NSXMLNodeOrder::number(*a) > NSXMLNodeOrder::number(*b);
   return XQueryNodeAfterByClimbing(a, b);
 }
 

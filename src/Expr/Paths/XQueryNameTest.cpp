@@ -8,6 +8,7 @@
 
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQueryLeaves.h"
+#include "Platform/Tree/Names.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
 #include "xquery/Collection.h"

@@ -3,6 +3,7 @@
 
 #include "Expr/XQueryExpr.h"
 #include "Expr/XQueryLeaves.h"
+#include "Platform/Tree/Names.h"
 #include "Types/XQueryQName.h"
 #include "xquery/XMLNode.h"
 

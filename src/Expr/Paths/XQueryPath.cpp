@@ -22,7 +22,7 @@ namespace xquery {
 namespace {
 
 [[noreturn]] void raiseNoNode(const XQueryErrorText<>& text, XQueryContext& context) {
-  context._internal().raise(text.error());
+  _internal(context).raise(text.error());
 }
 
 }  // namespace
@@ -152,7 +152,7 @@ void XQueryAxisStep::processNodes(const std::vector<NSXMLNode*>& nodes, XQueryPa
 
 void XQueryAxisStep::processNode(NSXMLNode* node, XQueryPathRun& run) const {
   XQueryCheckStack(run.context);
-  run.context._internal().setContextItem(node, 0);
+  _internal(run.context).setContextItem(node, 0);
   if (_predicates.empty()) {
     stream(node, run);
   } else {
@@ -237,7 +237,7 @@ void XQueryFilterStep::processItems(const Value& items, XQueryPathResults& toRes
 
 void XQueryFilterStep::processValue(const Value& items, XQueryPathRun& run, bool validate) const {
   const XQueryItemList list(items.get());
-  run.context._internal().setLast(static_cast<int64_t>(list.count()));
+  _internal(run.context).setLast(static_cast<int64_t>(list.count()));
   for (size_t i = 0; i < list.count(); ++i) {
     processItem(list[i], static_cast<int64_t>(i) + 1, run, validate);
     if (run.hasFailed) return;
@@ -245,13 +245,13 @@ void XQueryFilterStep::processValue(const Value& items, XQueryPathRun& run, bool
 }
 
 void XQueryFilterStep::processNode(NSXMLNode* node, XQueryPathRun& run) const {
-  run.context._internal().setLast(1);
+  _internal(run.context).setLast(1);
   processItem(node, 1, run, false);
 }
 
 void XQueryFilterStep::processNodes(const std::vector<NSXMLNode*>& nodes,
                                     XQueryPathRun& run) const {
-  run.context._internal().setLast(static_cast<int64_t>(nodes.size()));
+  _internal(run.context).setLast(static_cast<int64_t>(nodes.size()));
   for (size_t i = 0; i < nodes.size(); ++i) {
     processItem(nodes[i], static_cast<int64_t>(i) + 1, run, false);
     if (run.hasFailed) return;
@@ -261,7 +261,7 @@ void XQueryFilterStep::processNodes(const std::vector<NSXMLNode*>& nodes,
 Value XQueryFilterStep::valueFor(NSObject* item, int64_t position, XQueryContext& context) const {
   XQueryCheckStack(context);
   if (_next && !XQueryIsNode(item)) raiseNoNode(XQueryErrors::itemNotANode, context);
-  context._internal().setContextItem(item, position);
+  _internal(context).setContextItem(item, position);
   Value value = _expr ? _expr->evaluateWithContext(context) : Value(NSNull::null());
   if (value) value = handlePreicatesFromIndex(0, std::move(value), context);
   if (XQueryHasFailed(value, context)) return {};
@@ -297,9 +297,8 @@ Ref<XQueryRootStepExpr> XQueryRootStepExpr::expr() {
 }
 
 Value XQueryRootStepExpr::computeValue(XQueryContext& context) const {
-  const auto* node = dyn_cast<NSXMLNode>(context._internal().contextItem());
-  if (!node)
-    return context._internal().fail(XQueryErrors::contextItemNotANode.error(), exprPlace());
+  const auto* node = dyn_cast<NSXMLNode>(_internal(context).contextItem());
+  if (!node) return _internal(context).fail(XQueryErrors::contextItemNotANode.error(), exprPlace());
   return XQueryTreatAs(node->rootNode(), *_type, context);
 }
 
@@ -338,7 +337,7 @@ void XQueryPathExpr::visitParts(XQueryPartVisitor& visitor) {
 // An error leaves the focus as it was when it was raised.
 Value XQueryPathExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
   Value contextItem = dynamic.contextItem();
@@ -351,7 +350,7 @@ Value XQueryPathExpr::computeValue(XQueryContext& context) const {
 
 Value XQueryPathExpr::walkSteps(XQueryContext& context) const {
   const XQueryStep* step = _step.get();
-  Value items = step ? context._internal().contextItem() : NSNull::null();
+  Value items = step ? _internal(context).contextItem() : NSNull::null();
   if (step && !isa<XQueryAxisStep>(step)) {
     items = step->expr() ? step->expr()->evaluateWithContext(context) : Value(NSNull::null());
     if (XQueryHasFailed(items, context)) return {};
@@ -363,7 +362,7 @@ Value XQueryPathExpr::walkSteps(XQueryContext& context) const {
   XQueryPathResults results;
   XQueryPathRun run(results, context);
   step->processValue(items, run, true);
-  return run.hasFailed ? Value() : results.value(context._internal().ordered());
+  return run.hasFailed ? Value() : results.value(_internal(context).ordered());
 }
 
 }  // namespace xquery

@@ -4,6 +4,7 @@
 #include "Expr/Paths/NodeOrder.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/TreeHead.h"
 #include "Types/XQueryErrors.h"
 #include "Types/XQueryTypeTable.h"
 
@@ -13,7 +14,7 @@ namespace xquery {
 namespace {
 
 [[noreturn]] void raiseWrongItem(const XQueryErrorText<>& text, XQueryContext& context) {
-  context._internal().raise(text.error());
+  _internal(context).raise(text.error());
 }
 
 }  // namespace
@@ -57,9 +58,10 @@ void XQueryPathResults::storeNode(NSXMLNode* node) {
 
 bool XQueryPathResults::continuesOrder(const NSXMLNode* node) {
   const auto* last = cast<NSXMLNode>(_lastStored);
-  if (!NSXMLNode::haveComparableOrder(last, node)) return false;
-  const Arrival step =
-      last->orderNumber() < node->orderNumber() ? Arrival::Ascending : Arrival::Descending;
+  if (!NSXMLNodeOrder::areComparable(last, node)) return false;
+  const Arrival step = NSXMLNodeOrder::number(*last) < NSXMLNodeOrder::number(*node)
+                           ? Arrival::Ascending
+                           : Arrival::Descending;
   if (_arrival == Arrival::AnyOrder) _arrival = step;
   return _arrival == step;
 }

@@ -4,6 +4,7 @@
 #include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Names.h"
 #include "Types/XQueryAtomization.h"
 
 namespace xquery {
@@ -30,8 +31,8 @@ bool XQueryAllAreNodes(const Value& items) {
 
 bool XQueryPathRun::contextHasDefaultNamespace() {
   if (_defaultNamespace == DefaultNamespace::Unknown) {
-    _defaultNamespace = context._internal().hasDefaultNamespace() ? DefaultNamespace::Present
-                                                                  : DefaultNamespace::None;
+    _defaultNamespace = _internal(context).hasDefaultNamespace() ? DefaultNamespace::Present
+                                                                 : DefaultNamespace::None;
   }
   return _defaultNamespace == DefaultNamespace::Present;
 }

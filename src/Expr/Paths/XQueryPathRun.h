@@ -5,6 +5,7 @@
 #include "Expr/Paths/XQueryNameTest.h"
 #include "Expr/Paths/XQueryPathResults.h"
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
+#include "Platform/Tree/Names.h"
 #include "xquery/XMLNode.h"
 
 #include <cstdint>

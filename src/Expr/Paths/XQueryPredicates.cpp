@@ -47,13 +47,13 @@ bool selects(const Value& result, int64_t position, XQueryContext& context) {
 // Null when a limit was reached.
 Value keptItems(const Value& items, const XQueryExpr& predicate, XQueryContext& context) {
   const XQueryItemList list(items.get());
-  context._internal().setLast(static_cast<int64_t>(list.count()));
+  _internal(context).setLast(static_cast<int64_t>(list.count()));
   XQueryGatherer kept;
   for (size_t i = 0; i < list.count(); ++i) {
     NSObject* item = list[i];
     const bool isKept = XQueryStep::keeps(predicate, item, static_cast<int64_t>(i) + 1, context);
     if (isKept && item && item->kind() != Kind::Null) kept.add(item);
-    if (context._internal().isFailing()) return {};
+    if (_internal(context).isFailing()) return {};
   }
   return kept.value();
 }
@@ -61,13 +61,13 @@ Value keptItems(const Value& items, const XQueryExpr& predicate, XQueryContext& 
 // False when a limit was reached.
 bool keepNodes(std::vector<NSXMLNode*>& nodes, const XQueryExpr& predicate,
                XQueryContext& context) {
-  context._internal().setLast(static_cast<int64_t>(nodes.size()));
+  _internal(context).setLast(static_cast<int64_t>(nodes.size()));
   size_t kept = 0;
   for (size_t i = 0; i < nodes.size(); ++i) {
     NSXMLNode* node = nodes[i];
     if (XQueryStep::keeps(predicate, node, static_cast<int64_t>(i) + 1, context)) {
       nodes[kept++] = node;
-    } else if (context._internal().isFailing()) {
+    } else if (_internal(context).isFailing()) {
       return false;
     }
   }
@@ -80,7 +80,7 @@ bool keepNodes(std::vector<NSXMLNode*>& nodes, const XQueryExpr& predicate,
 bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t position,
                        XQueryContext& context) {
   checkWork();
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   dynamic.setContextItem(item, position);
   const int64_t last = dynamic.last();
   const Value result = predicate.evaluateWithContext(context);
@@ -93,7 +93,7 @@ bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t posi
 }
 
 uint64_t XQueryStep::positionIn(const XQueryExpr& predicate, XQueryContext& context) {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
   Value item = dynamic.contextItem();

@@ -192,7 +192,7 @@ bool XQueryInstanceOf(const NSObject* object, const XQueryTypeDeclaration& insta
 Value XQueryTreatAs(const Value& object, const XQueryTypeDeclaration& treatAs,
                     XQueryContext& forContext) {
   if (!XQueryInstanceOf(object.get(), treatAs, &forContext)) {
-    forContext._internal().raise(XQueryErrors::invalidType.error());
+    _internal(forContext).raise(XQueryErrors::invalidType.error());
   }
   return object;
 }

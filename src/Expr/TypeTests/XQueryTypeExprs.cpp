@@ -6,6 +6,7 @@
 #include "Expr/XQueryParts.h"
 #include "Expr/XQuerySequence.h"
 #include "Types/XQueryErrors.h"
+#include "xquery/Exception.h"
 #include "xquery/Number.h"
 
 namespace xquery {
@@ -72,8 +73,8 @@ Value XQueryCastExpr::computeValue(XQueryContext& context) const {
     result = castObject(value, _type->typeID(), context, allowEmpty);
   }
   if (result) return result;
-  return context._internal().fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()),
-                                  exprPlace());
+  return _internal(context).fail(XQueryErrors::invalidConversion.errorAtLine(exprLine()),
+                                 exprPlace());
 }
 
 Ref<XQueryCastableExpr> XQueryCastableExpr::castableExpr(Ref<XQueryExpr> expr,
@@ -82,7 +83,7 @@ Ref<XQueryCastableExpr> XQueryCastableExpr::castableExpr(Ref<XQueryExpr> expr,
 }
 
 Value XQueryCastableExpr::computeValue(XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const Value value = normalised(operand(context));
   if (XQueryHasFailed(value, context)) return {};
   // Several items are an error here, not merely not castable.

@@ -60,7 +60,7 @@ const XQueryCaseClauseExpr* XQueryTypeswitchExpr::clauseFor(const NSObject* valu
 Value XQueryTypeswitchExpr::evaluateClause(const XQueryCaseClauseExpr& clause, const Value& value,
                                            XQueryContext& context) const {
   if (clause.varID() == 0) return clause.evaluateWithContext(context);
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const Value former = dynamic.variableForID(clause.varID());
   dynamic.setVariable(value, clause.varID());
   Value result = clause.evaluateWithContext(context);
@@ -76,8 +76,8 @@ Value XQueryTypeswitchExpr::computeValue(XQueryContext& context) const {
   if (XQueryHasFailed(value, context) || isa<XQueryError>(value)) return value;
   const XQueryCaseClauseExpr* clause = clauseFor(value.get(), context);
   Value result = clause ? evaluateClause(*clause, value, context) : Value();
-  if (result || context._internal().isFailing()) return result;
-  return context._internal().fail(XQueryErrors::invalidType.errorAtLine(exprLine()), exprPlace());
+  if (result || _internal(context).isFailing()) return result;
+  return _internal(context).fail(XQueryErrors::invalidType.errorAtLine(exprLine()), exprPlace());
 }
 
 }  // namespace xquery

@@ -9,7 +9,7 @@
 namespace xquery {
 
 Value XQueryInnerKeys::computeValue(XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const Value item = dynamic.contextItem();
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();

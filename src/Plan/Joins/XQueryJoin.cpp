@@ -6,6 +6,7 @@
 #include "Plan/Joins/XQueryJoinPair.h"
 #include "Plan/Operators/XQueryTentative.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/TreeHead.h"
 #include "Types/XQueryAtomization.h"
 #include "xquery/Number.h"
 #include "xquery/XMLNode.h"
@@ -27,7 +28,7 @@ bool isBrieflySettledAround(const Value& value) {
 // Whether what is found outside the nodes is the same for the whole round, whatever is constructed
 // meanwhile.
 bool isInvariantInRound(const XQueryFacts& facts, XQueryContext& context) {
-  const auto& dynamic = context._internal();
+  const auto& dynamic = _internal(context);
   if (facts.does(XQueryDeeds::ReadsGlobals) || !facts.reads.isExact()) return false;
   const bool readsFocus = facts.does(XQueryDeeds::ReadsItem | XQueryDeeds::ReadsRoot);
   if (readsFocus && !isBrieflySettledAround(dynamic.contextItem())) return false;
@@ -87,7 +88,8 @@ class XQueryJoin::Tables final : public XQueryKeptValue {
         pacer.turn();
         const auto* a = cast<NSXMLNode>(one.get());
         const auto* b = cast<NSXMLNode>(other.get());
-        return !NSXMLNode::haveComparableOrder(a, b) || a->orderNumber() >= b->orderNumber();
+        return !NSXMLNodeOrder::areComparable(a, b) ||
+               NSXMLNodeOrder::number(*a) >= NSXMLNodeOrder::number(*b);
       };
       _isAscending = std::adjacent_find(items->begin(), items->end(), breaksOrder) == items->end();
     }
@@ -137,7 +139,7 @@ std::unique_ptr<const XQueryJoin> XQueryJoin::ofStep(const XQueryExpr& owner,
 
 bool XQueryJoin::pick(const Value& source, const Lister& listItems, XQueryContext& context,
                       XQueryPicks& picks) const {
-  if (!source || context._internal().showsErrors()) return false;
+  if (!source || _internal(context).showsErrors()) return false;
   if (_varID != 0 && XQueryItemList(source.get()).count() < XQueryJoinTable::fewestItems) {
     return false;
   }
@@ -167,7 +169,7 @@ bool XQueryJoin::pick(const Value& source, const Lister& listItems, XQueryContex
 // The tables that are kept, or new ones when they are worth it; null for the plain way.
 std::shared_ptr<XQueryJoin::Tables> XQueryJoin::tables(const Value& source, const Lister& listItems,
                                                        XQueryContext& context) const {
-  auto& keptValues = context._internal().keptValues();
+  auto& keptValues = _internal(context).keptValues();
   if (keptValues.looksAway(_owner)) return nullptr;
   std::shared_ptr<XQueryKeptValue> kept;
   switch (keptValues.use(_owner, {&source, 1}, _looksAroundSource, kept)) {
@@ -214,7 +216,7 @@ bool XQueryJoin::addTable(Tables& tables, XQueryContext& context) const {
     const size_t nextOfAll = tables.next;
     if (terms[term].mustAnswer) tables.next = terms.size();
     if (looksOut && !XQueryAreSettled(items, true)) continue;
-    auto& dynamic = context._internal();
+    auto& dynamic = _internal(context);
     const Value item = dynamic.contextItem();
     const int64_t position = dynamic.position();
     auto made =
@@ -234,7 +236,7 @@ bool XQueryJoin::addTable(Tables& tables, XQueryContext& context) const {
 
 Value XQueryJoin::keyOf(const Value& item, size_t position, size_t term,
                         XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   if (_varID != 0) {
     dynamic.setVariable(item, _varID);
   } else {

@@ -25,14 +25,14 @@ bool XQueryJoinKeys::add(size_t clause, XQueryGatherer& keys, XQueryContext& con
   Value value = each.expr->evaluateWithContext(context);
   if (!value || XQueryHasFailed(value, context)) return false;
   if (!each.isLoop) {
-    context._internal().setVariable(std::move(value), each.varID);
+    _internal(context).setVariable(std::move(value), each.varID);
     return add(clause + 1, keys, context);
   }
   std::vector<Value> items;
   if (!XQueryListItems(XQueryItemList(value.get()), items)) return false;
   for (Value& item : items) {
     checkWork();
-    context._internal().setVariable(std::move(item), each.varID);
+    _internal(context).setVariable(std::move(item), each.varID);
     if (!add(clause + 1, keys, context)) return false;
   }
   return true;

@@ -1,5 +1,6 @@
 #include "Plan/Joins/XQueryJoinOperand.h"
 
+#include "Platform/Numbers/NumberText.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Number.h"
 #include "xquery/String.h"

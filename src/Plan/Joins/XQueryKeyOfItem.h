@@ -18,7 +18,7 @@ class XQueryKeyOfItem : public XQueryPlannedExpr {
 
   // The key, with the context item in the variable, which stays there.
   Value computeValue(XQueryContext& context) const override {
-    auto& dynamic = context._internal();
+    auto& dynamic = _internal(context);
     dynamic.setVariable(Value(dynamic.contextItem()), _varID);
     return plain().evaluateWithContext(context);
   }

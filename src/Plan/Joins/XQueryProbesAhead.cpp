@@ -24,7 +24,7 @@ Value XQueryProbesAhead::computeValue(XQueryContext& context) const {
   if (!areSure || picks.chosen.size() > fewItems) return {};
   XQueryGatherer probes;
   for (const XQueryPick& pick : picks.chosen) {
-    context._internal().setVariable((*picks.items)[pick.position], _varID);
+    _internal(context).setVariable((*picks.items)[pick.position], _varID);
     Value probe = plain().evaluateWithContext(context);
     if (!probe || XQueryHasFailed(probe, context)) return {};
     probes.add(std::move(probe));

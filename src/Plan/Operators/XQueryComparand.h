@@ -1,6 +1,7 @@
 // One item of an operand of a comparison, with what comparing it has found out.
 #pragma once
 
+#include "Platform/Numbers/NumberText.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"

@@ -1,5 +1,6 @@
 #include "Plan/Operators/XQueryConstantComparison.h"
 
+#include "Platform/Numbers/NumberText.h"
 #include "Types/XQueryUntypedText.h"
 #include "xquery/Number.h"
 

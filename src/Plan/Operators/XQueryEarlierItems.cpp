@@ -87,7 +87,7 @@ std::shared_ptr<XQueryEarlierItems::Table> XQueryEarlierItems::tableOf(
     const Value& items, XQueryContext& context) const {
   if (XQueryItemList(items.get()).count() < fewItems) return nullptr;
   if (!_operands.walk.isOpen(context)) return nullptr;
-  auto& keptValues = context._internal().keptValues();
+  auto& keptValues = _internal(context).keptValues();
   if (keptValues.looksAway(*this)) return nullptr;
   std::shared_ptr<XQueryKeptValue> kept;
   const auto use = keptValues.use(*this, {&items, 1}, false, kept);
@@ -115,7 +115,7 @@ std::optional<bool> XQueryEarlierItems::answer(const Value& value, XQueryContext
 }
 
 Value XQueryEarlierItems::computeValue(XQueryContext& context) const {
-  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
+  if (_internal(context).showsErrors()) return plain().evaluateWithContext(context);
   const Value value = _operands.value->evaluateWithContext(context);
   if (XQueryHasFailed(value, context)) return {};
   const auto isMet = answer(value, context);

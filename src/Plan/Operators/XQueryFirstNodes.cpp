@@ -7,12 +7,12 @@ namespace xquery {
 
 Value XQueryFirstNodes::computeValue(XQueryContext& context) const {
   // Diagnostics show every error that a predicate meets.
-  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
+  if (_internal(context).showsErrors()) return plain().evaluateWithContext(context);
   return XQueryAsk(*_path, context, [&] { return _path->firstItems(_most, context); });
 }
 
 Value XQueryFirstTuples::computeValue(XQueryContext& context) const {
-  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
+  if (_internal(context).showsErrors()) return plain().evaluateWithContext(context);
   return cast<XQueryFLWORExpr>(&plain())->firstItems(_most, context);
 }
 

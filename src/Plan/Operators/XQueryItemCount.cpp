@@ -35,12 +35,12 @@ std::optional<uint64_t> countItemsOfCall(const XQueryFunctionCall& call, uint64_
   const auto ask = [&](const XQueryExpr& body) {
     const XQueryWalkedPath* path = countingPathIn(body);
     if (path) count = countItemsOfPath(*path, most, context);
-    if (count || context._internal().isFailing()) return count.has_value();
+    if (count || _internal(context).isFailing()) return count.has_value();
     const Value items = body.evaluateWithContext(context);
     if (auto* error = dyn_cast<XQueryError>(items)) {
-      context._internal().fail(error, call.exprPlace());
+      _internal(context).fail(error, call.exprPlace());
     }
-    if (!items || context._internal().isFailing()) return false;
+    if (!items || _internal(context).isFailing()) return false;
     count = XQueryItemList(items.get()).count();
     return true;
   };
@@ -109,12 +109,12 @@ bool XQueryCountsItems(const XQueryExpr& expr) {
 
 Value XQueryItemCount::computeValue(XQueryContext& context) const {
   // Diagnostics show every error that a condition meets.
-  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
+  if (_internal(context).showsErrors()) return plain().evaluateWithContext(context);
   XQueryCheckStack(context);
   const bool isAll = !_mayEndEarly || _question.least == 0;
   const auto count = countItems(*_counted, isAll ? UINT64_MAX : _question.least, context);
   if (count) return _question.answer(*count);
-  return context._internal().isFailing() ? Value() : plain().evaluateWithContext(context);
+  return _internal(context).isFailing() ? Value() : plain().evaluateWithContext(context);
 }
 
 Value XQueryKeptCount::computeValue(XQueryContext& context) const {
@@ -124,7 +124,7 @@ Value XQueryKeptCount::computeValue(XQueryContext& context) const {
 }
 
 Value XQueryAskedCount::computeValue(XQueryContext& context) const {
-  const auto* count = dyn_cast<NSNumber>(context._internal().variableForID(_varID));
+  const auto* count = dyn_cast<NSNumber>(_internal(context).variableForID(_varID));
   if (!count) return plain().evaluateWithContext(context);
   return _question.answer(static_cast<uint64_t>(count->integerValue()));
 }

@@ -170,9 +170,9 @@ Ref<XQueryKeptExpr> XQueryKeptExpr::exprWithPlain(Ref<XQueryExpr> plain, const X
 }
 
 Value XQueryKeptExpr::computeValue(XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   auto& keptValues = dynamic.keptValues();
-  if (keptValues.looksAway(*this) || context._internal().showsErrors()) {
+  if (keptValues.looksAway(*this) || _internal(context).showsErrors()) {
     return plain().evaluateWithContext(context);
   }
   const Dependencies dependencies(_facts, dynamic);

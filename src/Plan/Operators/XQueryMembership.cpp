@@ -49,7 +49,7 @@ std::shared_ptr<const XQueryMembership::Members> XQueryMembership::membersOf(
     const Value& set, XQueryContext& context) const {
   const auto* array = dyn_cast<NSArray>(set);
   if (!array || array->count() < fewMembers) return nullptr;
-  auto& keptValues = context._internal().keptValues();
+  auto& keptValues = _internal(context).keptValues();
   if (keptValues.looksAway(*this)) return nullptr;
   std::shared_ptr<XQueryKeptValue> kept;
   const auto use = keptValues.use(*this, {&set, 1}, false, kept);
@@ -62,7 +62,7 @@ std::shared_ptr<const XQueryMembership::Members> XQueryMembership::membersOf(
 
 Value XQueryMembership::computeValue(XQueryContext& context) const {
   // Diagnostics show each error once.
-  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
+  if (_internal(context).showsErrors()) return plain().evaluateWithContext(context);
   Value node;
   if (!_operands.isSetFirst) {
     node = normalised(_operands.node->evaluateWithContext(context));
@@ -72,7 +72,7 @@ Value XQueryMembership::computeValue(XQueryContext& context) const {
   if (XQueryHasFailed(set, context)) return {};
   const auto members = membersOf(set, context);
   if (!members) return plain().evaluateWithContext(context);
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const auto& items = cast<NSArray>(set)->objects();
   if (_question == Question::Some) dynamic.setVariable(items.front(), _operands.varID);
   if (_operands.isSetFirst) {

@@ -13,7 +13,7 @@ std::optional<bool> XQueryNameComparison::holdsFor(NSXMLNode* node, const XQuery
 }
 
 Value XQueryNameComparison::computeValue(XQueryContext& context) const {
-  auto* node = dyn_cast<NSXMLNode>(context._internal().contextItem());
+  auto* node = dyn_cast<NSXMLNode>(_internal(context).contextItem());
   const auto answer = node ? holdsFor(node, context) : std::nullopt;
   return answer ? Value(NSNumber::numberWithBool(*answer)) : plain().evaluateWithContext(context);
 }

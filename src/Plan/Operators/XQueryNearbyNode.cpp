@@ -6,7 +6,7 @@
 namespace xquery {
 
 const NSXMLNode* XQueryNearbyNode::wantedIn(const XQueryContext& context) const {
-  return dyn_cast<NSXMLNode>(context._internal().variableForID(_varID));
+  return dyn_cast<NSXMLNode>(_internal(context).variableForID(_varID));
 }
 
 bool XQueryNearbyNode::finds(const NSXMLNode* wanted, NSXMLNode* start) const {
@@ -29,7 +29,7 @@ Value XQueryNearbyNode::computeValue(XQueryContext& context) const {
   NSXMLNode* start = _walk.start(context);
   const NSXMLNode* wanted = wantedIn(context);
   if (!start || !wanted) return plain().evaluateWithContext(context);
-  return finds(wanted, start) ? Value(context._internal().variableForID(_varID))
+  return finds(wanted, start) ? Value(_internal(context).variableForID(_varID))
                               : Value(NSNull::null());
 }
 

@@ -39,7 +39,7 @@ std::optional<bool> XQueryPathCount::holdsFor(NSXMLNode* node, const XQueryConte
 
 Value XQueryPathCount::computeValue(XQueryContext& context) const {
   // Diagnostics show every error that a predicate meets.
-  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
+  if (_internal(context).showsErrors()) return plain().evaluateWithContext(context);
   const uint64_t least = _question.least;
   NSXMLNode* start = _isShort ? _shortWalk.start(context) : nullptr;
   if (start && least > 0) return NSNumber::numberWithBool(holdsFrom(start));

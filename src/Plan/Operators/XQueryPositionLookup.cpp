@@ -102,7 +102,7 @@ std::shared_ptr<const XQueryPositionLookup::Table> XQueryPositionLookup::tableOf
     const Value& list, XQueryContext& context) const {
   const auto* array = dyn_cast<NSArray>(list);
   if (!array || array->count() < fewItems || array->count() > UINT32_MAX) return nullptr;
-  auto& keptValues = context._internal().keptValues();
+  auto& keptValues = _internal(context).keptValues();
   if (keptValues.looksAway(*this)) return nullptr;
   std::shared_ptr<XQueryKeptValue> kept;
   const auto use = keptValues.use(*this, {&list, 1}, false, kept);
@@ -115,7 +115,7 @@ std::shared_ptr<const XQueryPositionLookup::Table> XQueryPositionLookup::tableOf
 
 Value XQueryPositionLookup::computeValue(XQueryContext& context) const {
   // Diagnostics show each error once.
-  if (context._internal().showsErrors()) return plain().evaluateWithContext(context);
+  if (_internal(context).showsErrors()) return plain().evaluateWithContext(context);
   const Value list = _list->evaluateWithContext(context);
   if (XQueryHasFailed(list, context)) return {};
   const auto table = tableOf(list, context);

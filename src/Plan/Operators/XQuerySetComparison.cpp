@@ -51,7 +51,7 @@ Value XQuerySetComparison::computeValue(XQueryContext& context) const {
   const size_t rightCount = XQueryItemList(right.get()).count();
   const size_t pairs = leftCount * rightCount;
   const size_t work = pairs ? pairs : leftCount + rightCount;
-  if (work <= fewPairs || context._internal().showsErrors())
+  if (work <= fewPairs || _internal(context).showsErrors())
     return _comparison.answerFor(left, right, context);
   const bool setIsLeft = leftCount > rightCount;
   const auto set = setOf(setIsLeft ? left : right, setIsLeft, work >= manyPairs, context);
@@ -65,7 +65,7 @@ Value XQuerySetComparison::computeValue(XQueryContext& context) const {
 std::shared_ptr<XQueryJoinTable> XQuerySetComparison::setOf(const Value& items, bool isLeft,
                                                             bool isWorthIt,
                                                             XQueryContext& context) const {
-  auto& keptValues = context._internal().keptValues();
+  auto& keptValues = _internal(context).keptValues();
   if (!isWorthIt && keptValues.looksAway(*this)) return nullptr;
   std::shared_ptr<XQueryKeptValue> kept;
   // Which side it is decides how it is asked.

@@ -47,7 +47,7 @@ std::optional<uint64_t> XQuerySetCount::countFrom(const NSXMLDocument& document,
 }
 
 Value XQuerySetCount::computeValue(XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   // Diagnostics show every error that a predicate meets.
   auto* item = dynamic.showsErrors() ? nullptr : dyn_cast<NSXMLNode>(dynamic.contextItem());
   const auto* document = item ? dyn_cast<NSXMLDocument>(item->rootNode()) : nullptr;

@@ -45,13 +45,13 @@ class XQueryShortWalk {
 
   // Whether names need not be resolved in the namespaces of the context.
   bool isOpen(const XQueryContext& context) const {
-    return !_needsNoDefaultNamespace || !context._internal().hasDefaultNamespace();
+    return !_needsNoDefaultNamespace || !_internal(context).hasDefaultNamespace();
   }
   // The node to start from; null where the walk is not open: there is none or there are several, or
   // names have to be resolved in the namespaces of the context.
   NSXMLNode* start(const XQueryContext& context) const {
     if (!isOpen(context)) return nullptr;
-    const auto& dynamic = context._internal();
+    const auto& dynamic = _internal(context);
     return dyn_cast<NSXMLNode>(_varID ? dynamic.variableForID(_varID)
                                       : dynamic.contextItem().get());
   }

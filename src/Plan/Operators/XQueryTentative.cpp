@@ -5,7 +5,7 @@
 namespace xquery {
 
 Value XQueryValueOrNull(const XQueryExpr& expr, XQueryContext& context) {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const Value item = dynamic.contextItem();
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();

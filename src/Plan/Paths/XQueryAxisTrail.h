@@ -29,6 +29,7 @@
 
 #include "Expr/Paths/IdentitySet.h"
 #include "Plan/Paths/XQueryIndexedWalk.h"
+#include "Platform/Tree/TreeHead.h"
 #include "xquery/XMLNode.h"
 
 #include <memory>
@@ -78,7 +79,8 @@ class XQueryAxisTrail {
     return node->kind() == Kind::Attribute || node->kind() == Kind::Namespace;
   }
   static bool isBefore(const NSXMLNode* a, const NSXMLNode* b) {
-    return NSXMLNode::haveComparableOrder(a, b) && a->orderNumber() < b->orderNumber();
+    return NSXMLNodeOrder::areComparable(a, b) &&
+           NSXMLNodeOrder::number(*a) < NSXMLNodeOrder::number(*b);
   }
 
   // From `first` up to (excluding) `stop`, which is null for the end of the document. A second
@@ -88,7 +90,7 @@ class XQueryAxisTrail {
     if (!first || first == stop) return;
     const NSXMLNode* oldFirst = _first;
     NSXMLNode* oldStop = _stop;
-    const bool isApart = !oldFirst || !NSXMLNode::haveComparableOrder(first, oldFirst) ||
+    const bool isApart = !oldFirst || !NSXMLNodeOrder::areComparable(first, oldFirst) ||
                          (stop && isBefore(stop, oldFirst)) ||
                          (oldStop && isBefore(oldStop, first));
     if (isApart) {
@@ -108,8 +110,8 @@ class XQueryAxisTrail {
   // the latest one from now on, unless it comes before that.
   const NSXMLNode* contextUpTo(NSXMLNode* node) {
     NSXMLNode* const earlier = _context;
-    if (earlier && NSXMLNode::haveComparableOrder(earlier, node)) {
-      if (node->orderNumber() < earlier->orderNumber()) return nullptr;
+    if (earlier && NSXMLNodeOrder::areComparable(earlier, node)) {
+      if (NSXMLNodeOrder::number(*node) < NSXMLNodeOrder::number(*earlier)) return nullptr;
       _context = node;
       return earlier;
     }
@@ -117,7 +119,7 @@ class XQueryAxisTrail {
     return nullptr;
   }
   static bool isAfter(const NSXMLNode* node, const NSXMLNode* context) {
-    return !context || node->orderNumber() > context->orderNumber();
+    return !context || NSXMLNodeOrder::number(*node) > NSXMLNodeOrder::number(*context);
   }
 
   // What follows an ancestor of the earlier item follows that item as well.

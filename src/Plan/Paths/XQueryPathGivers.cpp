@@ -12,7 +12,7 @@ void XQueryGiveItems(const Value& list, XQueryItemGiver::Taker& taker) {
 }
 
 bool XQueryShortPathGiver::giveItems(XQueryContext& context, Taker& taker) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   if (NSXMLNode* const start = _walk.start(context); start && !dynamic.showsErrors()) {
     // The variable that it starts from may be the one that takes the nodes.
     const Value held(start);

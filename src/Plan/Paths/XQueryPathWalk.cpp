@@ -10,6 +10,7 @@
 #include "Plan/Paths/XQueryIndexedWalk.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/TreeHead.h"
 #include "Types/XQueryErrors.h"
 
 #include <algorithm>
@@ -95,14 +96,14 @@ void XQueryPathWalk::takeValue(size_t index, const Value& items, bool validate) 
   const XQueryItemList list(items.get());
   if (index == _steps.size()) return results.add(items.get(), context);
   const bool isExpression = _steps[index].isExpression();
-  if (isExpression) context._internal().setLast(static_cast<int64_t>(list.count()));
+  if (isExpression) _internal(context).setLast(static_cast<int64_t>(list.count()));
   for (size_t i = 0; i < list.count(); ++i) {
     if (isExpression) {
       takeItem(index, list[i], static_cast<int64_t>(i) + 1, validate);
     } else if (auto* node = dyn_cast<NSXMLNode>(list[i])) {
       takeNode(index, node);
     } else if (validate) {
-      context._internal().raise(XQueryErrors::contextItemNotANode.error());
+      _internal(context).raise(XQueryErrors::contextItemNotANode.error());
     }
     if (isOver()) return;
   }
@@ -110,7 +111,7 @@ void XQueryPathWalk::takeValue(size_t index, const Value& items, bool validate) 
 
 void XQueryPathWalk::takeNodes(size_t index, std::span<NSXMLNode* const> nodes) {
   const bool isExpression = index < _steps.size() && _steps[index].isExpression();
-  if (isExpression) context._internal().setLast(static_cast<int64_t>(nodes.size()));
+  if (isExpression) _internal(context).setLast(static_cast<int64_t>(nodes.size()));
   WorkPacer pacer;
   int64_t position = 0;
   for (NSXMLNode* node : nodes) {
@@ -131,11 +132,11 @@ void XQueryPathWalk::takeNode(size_t index, NSXMLNode* node) {
   if (index == _steps.size()) return results.addNode(node, context);
   const XQueryWalkedStep& step = _steps[index];
   if (step.isExpression()) {
-    context._internal().setLast(1);
+    _internal(context).setLast(1);
     return takeItem(index, node, 1, false);
   }
   XQueryCheckStack(context);
-  if (setsEveryFocus || step.testMayRaise) context._internal().setContextItem(node, 0);
+  if (setsEveryFocus || step.testMayRaise) _internal(context).setContextItem(node, 0);
   if (absorbsNext(step, node)) {
     if (_steps[index + 1].countsBelow) return takeCountedBelow(index + 1, node);
     const bool isChild = _steps[index + 1].axis == XQueryAxisChild;
@@ -161,7 +162,7 @@ bool XQueryPathWalk::absorbsNext(const XQueryWalkedStep& step, const NSXMLNode* 
   if (!isOpen || !(&step + 1)->countsBelow) return isOpen;
   // Parents are told apart by their order.
   return !listingStep &&
-         (!node->firstChild() || NSXMLNode::haveComparableOrder(node, node->firstChild()));
+         (!node->firstChild() || NSXMLNodeOrder::areComparable(node, node->firstChild()));
 }
 
 // Parents that are open, the innermost last, with the number of their children met so far. Children
@@ -186,9 +187,9 @@ class XQueryPathWalk::ChildCounts {
   };
 
   static bool isDone(const NSXMLNode& one, const NSXMLNode& next) {
-    if (one.orderNumber() > next.orderNumber()) return true;
+    if (NSXMLNodeOrder::number(one) > NSXMLNodeOrder::number(next)) return true;
     const NSXMLNode* behind = one.nextSibling();
-    return behind && behind->orderNumber() <= next.orderNumber();
+    return behind && NSXMLNodeOrder::number(*behind) <= NSXMLNodeOrder::number(next);
   }
 
   std::vector<Parent, ValueAllocator<Parent>> _open;
@@ -232,7 +233,7 @@ bool XQueryPathWalk::takeLookedUp(size_t index, int axis, NSXMLNode* node) {
       axis == XQueryAxisChild || axis == XQueryAxisDescendant || axis == XQueryAxisAttributesBelow;
   if (!isOpen || listingStep || setsEveryFocus) return false;
   // Diagnostics would show an error of the value twice.
-  if (context._internal().showsErrors()) return false;
+  if (_internal(context).showsErrors()) return false;
   XQueryStepTest test(step, *this);
   std::vector<NSXMLNode*>& nodes = openNodeList();
   const bool areFound = step.lookup->find(node, axis, test, context, nodes);
@@ -286,7 +287,7 @@ bool XQueryPathWalk::keepsAlone(const XQueryWalkedStep& step, size_t firstPredic
     if (answer.value_or(false)) continue;
     if (answer) return false;
     if (XQueryStep::keeps(**each, node, 1, context)) continue;
-    hasFailed = context._internal().isFailing();
+    hasFailed = _internal(context).isFailing();
     return false;
   }
   return true;
@@ -327,7 +328,7 @@ bool XQueryPathWalk::keepRange(const XQueryPositionRange& range, std::vector<NSX
 // The focus that asking leaves is that of the last node.
 bool XQueryPathWalk::keepNodes(const XQueryExpr& predicate, const XQueryNodeQuestion& question,
                                std::vector<NSXMLNode*>& nodes) {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   dynamic.setLast(static_cast<int64_t>(nodes.size()));
   NSXMLNode* const last = nodes.empty() ? nullptr : nodes.back();
   WorkPacer pacer;
@@ -496,7 +497,7 @@ void XQueryPathWalk::collectComputed(const XQueryWalkedStep& step, int axis, NSX
     nodes.push_back(found);
     return false;
   });
-  hasFailed = hasFailed || context._internal().isFailing();
+  hasFailed = hasFailed || _internal(context).isFailing();
 }
 
 // The same for a range of positions; false where the predicate has to be asked of each node.

@@ -6,6 +6,8 @@
 #include "Plan/Paths/XQueryIndexedWalk.h"
 #include "Plan/Paths/XQueryWalkedStep.h"
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeHead.h"
 
 #include <algorithm>
 
@@ -31,7 +33,8 @@ Range rangeOf(NSXMLNode* node, int axis) {
 bool isWorthAsking(const Range& range) {
   if (!range.first || range.first == range.stop) return false;
   return !range.stop ||
-         range.stop->orderNumber() - range.first->orderNumber() >= NSXMLTreeIndexes::fewNodes;
+         NSXMLNodeOrder::number(*range.stop) - NSXMLNodeOrder::number(*range.first) >=
+             NSXMLTreeIndexes::fewNodes;
 }
 
 NSXMLValueKey keyOf(Of of, const NSXMLExpandedName* name, const XQueryValueWay& way) {
@@ -60,7 +63,7 @@ bool keepChildren(const NSXMLNode* parent, std::vector<NSXMLNode*>& nodes) {
 }
 
 bool isBefore(const NSXMLNode* a, const NSXMLNode* b) {
-  return a->orderNumber() < b->orderNumber();
+  return NSXMLNodeOrder::number(*a) < NSXMLNodeOrder::number(*b);
 }
 
 // Each once, in document order.
@@ -77,7 +80,7 @@ void putInOrder(std::vector<NSXMLNode*>& nodes) {
 
 // The probe may read the root above the focus, which is that above every candidate.
 Value valueFrom(const XQueryExpr& probe, NSXMLNode* node, XQueryContext& context) {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   Value item = dynamic.contextItem();
   const int64_t position = dynamic.position();
   dynamic.setContextItem(Value(node), 1);

@@ -12,6 +12,7 @@
 #pragma once
 
 #include "Plan/Paths/XQueryValueWay.h"
+#include "Platform/Tree/Names.h"
 #include "Platform/Tree/TreeIndexes.h"
 
 #include <vector>

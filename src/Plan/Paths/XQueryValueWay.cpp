@@ -2,6 +2,7 @@
 
 #include "Expr/Paths/XQueryNameTest.h"
 #include "Plan/Paths/XQueryWalkedStep.h"
+#include "Platform/Tree/Names.h"
 
 #include <algorithm>
 

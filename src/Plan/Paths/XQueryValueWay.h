@@ -3,6 +3,7 @@
 #pragma once
 
 #include "Context/XQueryContextInternal.h"
+#include "Platform/Tree/Names.h"
 #include "Platform/Tree/ValueIndex.h"
 
 #include <cstddef>
@@ -29,7 +30,7 @@ class XQueryValueWay {
 
   // Whether names need not be resolved in the namespaces of the context.
   bool isOpen(const XQueryContext& context) const {
-    return !_needsNoDefaultNamespace || !context._internal().hasDefaultNamespace();
+    return !_needsNoDefaultNamespace || !_internal(context).hasDefaultNamespace();
   }
   // The key by which an index finds the elements of the name from which the way leads to a value.
   NSXMLValueKey keyFor(const NSXMLExpandedName& element) const;

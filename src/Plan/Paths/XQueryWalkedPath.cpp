@@ -26,7 +26,7 @@ bool isKeptByAll(const XQueryStep& step, size_t firstPredicate, NSObject* item, 
 // As a step filters its items, which asks all of them by evaluating the predicate.
 Value keptItems(const Value& items, const XQueryExpr& predicate, const XQueryNodeQuestion& question,
                 XQueryContext& context) {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const XQueryItemList list(items.get());
   dynamic.setLast(static_cast<int64_t>(list.count()));
   XQueryGatherer kept;
@@ -138,7 +138,7 @@ const XQueryWalkedStep* XQueryWalkedPath::walked(const XQueryStep& asWritten) co
 
 // Diagnostics show every error that a predicate meets.
 bool XQueryWalkedPath::showsErrors(const XQueryContext& context) const {
-  return _hasPredicates && context._internal().showsErrors();
+  return _hasPredicates && _internal(context).showsErrors();
 }
 
 Value XQueryWalkedPath::computeValue(XQueryContext& context) const {
@@ -154,7 +154,7 @@ Value XQueryWalkedPath::computeValue(XQueryContext& context) const {
     case Answer::Results:
       break;
   }
-  return results.value(context._internal().ordered());
+  return results.value(_internal(context).ordered());
 }
 
 std::optional<uint64_t> XQueryWalkedPath::countNodes(uint64_t most, XQueryContext& context) const {
@@ -178,7 +178,7 @@ std::optional<uint64_t> XQueryWalkedPath::countItems(uint64_t most, XQueryContex
     return std::min<uint64_t>(XQueryItemList(items.get()).count(), most);
   }
   XQueryCheckStack(context);
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
   Value contextItem = dynamic.contextItem();
@@ -193,7 +193,7 @@ std::optional<uint64_t> XQueryWalkedPath::countItems(uint64_t most, XQueryContex
 
 std::optional<NSXMLNameIndex::Ways> XQueryWalkedPath::waysFrom(const NSXMLNameIndex& elements,
                                                                XQueryContext& context) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
   Value contextItem = dynamic.contextItem();
@@ -215,12 +215,12 @@ Value XQueryWalkedPath::firstItems(uint64_t most, XQueryContext& context) const 
   results.endAfter(most);
   Value items;
   const Answer answer = evaluate(context, items, results);
-  if (answer == Answer::Results) return results.value(context._internal().ordered());
+  if (answer == Answer::Results) return results.value(_internal(context).ordered());
   return answer == Answer::Items ? items : Value();
 }
 
 bool XQueryWalkedPath::giveItems(XQueryContext& context, XQueryItemGiver::Taker& taker) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   if (showsErrors(context)) {
     const Value items = plain().evaluateWithContext(context);
     if (XQueryHasFailed(items, context)) return false;
@@ -256,7 +256,7 @@ bool XQueryWalkedPath::mayEndEarly(const Value& items, const XQueryPathWalk& wal
 // An error leaves the focus as it was when it was raised.
 XQueryWalkedPath::Answer XQueryWalkedPath::evaluate(XQueryContext& context, Value& items,
                                                     XQueryPathResults& results) const {
-  auto& dynamic = context._internal();
+  auto& dynamic = _internal(context);
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
   Value contextItem = dynamic.contextItem();
@@ -269,7 +269,7 @@ XQueryWalkedPath::Answer XQueryWalkedPath::evaluate(XQueryContext& context, Valu
 
 XQueryWalkedPath::Answer XQueryWalkedPath::walk(XQueryContext& context, Value& items,
                                                 XQueryPathResults& results) const {
-  const auto& dynamic = context._internal();
+  const auto& dynamic = _internal(context);
   items = _path->step() ? Value(dynamic.contextItem()) : NSNull::null();
   if (_start) {
     items = evaluateStart(context);
@@ -337,14 +337,14 @@ bool XQueryWalkedPath::pickItems(Value& items, XQueryContext& context,
     items = NSNull::null();
     return true;
   }
-  context._internal().setLast(static_cast<int64_t>(picks.items->size()));
+  _internal(context).setLast(static_cast<int64_t>(picks.items->size()));
   XQueryGatherer kept;
   for (const XQueryPick& pick : picks.chosen) {
     const Value& item = (*picks.items)[pick.position];
     if (pick.isSure ||
         isKeptByAll(*_pickedStep, 0, item.get(), int64_t{pick.position} + 1, context)) {
       kept.add(item);
-    } else if (context._internal().isFailing()) {
+    } else if (_internal(context).isFailing()) {
       items = Value();
       return true;
     }
@@ -368,7 +368,7 @@ bool XQueryWalkedPath::listNodes(const Value& start, const XQueryWalkedStep& ste
 
 bool XQueryWalkedPath::listNodesBefore(const XQueryStep& step, XQueryContext& context,
                                        std::vector<Value>& nodes) const {
-  Value start = context._internal().contextItem();
+  Value start = _internal(context).contextItem();
   if (_start) {
     start = evaluateStart(context);
     if (XQueryHasFailed(start, context)) return false;
@@ -403,7 +403,7 @@ bool XQueryWalkedPath::pickNodes(const Value& start, XQueryPathWalk& walk) const
     // The predicates cannot tell at which position the node stands.
     if (pick.isSure || isKeptByAll(*step->step, step->predicatesInTest, node, 1, walk.context)) {
       nodes.push_back(node);
-    } else if (walk.context._internal().isFailing()) {
+    } else if (_internal(walk.context).isFailing()) {
       walk.hasFailed = true;
       return true;
     }

@@ -42,7 +42,7 @@ XQueryProfiledExpr::XQueryProfiledExpr(Ref<XQueryExpr> plain, XQueryCounterID co
       _counter(counter) {}
 
 Value XQueryProfiledExpr::computeValue(XQueryContext& context) const {
-  Measured measured(*context._internal().profile(), _counter);
+  Measured measured(*_internal(context).profile(), _counter);
   Value value = plain().evaluateWithContext(context);
   measured.leave(XQueryItemList(value.get()).count(), XQueryHasFailed(value, context));
   return value;
@@ -51,7 +51,7 @@ Value XQueryProfiledExpr::computeValue(XQueryContext& context) const {
 // Where there is no answer the expression is evaluated, which counts then.
 std::optional<bool> XQueryProfiledExpr::holdsFor(NSXMLNode* node,
                                                  const XQueryContext& context) const {
-  Measured measured(*context._internal().profile(), _counter);
+  Measured measured(*_internal(context).profile(), _counter);
   const std::optional<bool> answer = _question->holdsFor(node, context);
   if (answer) {
     measured.leave(1, false);

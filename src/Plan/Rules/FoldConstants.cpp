@@ -110,8 +110,8 @@ class Folding {
     if (XQueryHasFailed(value, *_context)) {
       // What ends the compilation ends it; anything else comes up when it is reached.
       _planning.refuse(place, "it fails, which it may do only when it is reached");
-      if (_context->_internal().isFailingForGood()) _context->_internal().throwFailure();
-      _context->_internal().passOverFailure(nullptr);
+      if (_internal(*_context).isFailingForGood()) _internal(*_context).throwFailure();
+      _internal(*_context).passOverFailure(nullptr);
       return;
     }
     if (!isSingleAtom(value)) return;

@@ -76,10 +76,6 @@ Ref<XQueryError> XQueryError::errorInModule(const XQueryError& error, Ref<NSStri
   return make<XQueryError>(error, std::move(moduleURL), error._placeAndCalls);
 }
 
-Ref<XQueryError> XQueryError::_errorWithTrace(const XQueryError& error, Ref<NSCounted> trace) {
-  return make<XQueryError>(error, error._moduleURL, std::move(trace));
-}
-
 Ref<XQueryError> XQueryError::error(XQueryErrorCategory ofCategory, int64_t number,
                                     const Ref<NSString>& withMsg) {
   return make<XQueryError>(ofCategory, number, withMsg, int64_t{0});

@@ -30,6 +30,8 @@
 // memory is large and not made of such parts counts it with countValueBlock and uncountValueBytes.
 #pragma once
 
+#include "xquery/Exception.h"
+
 #include <cstddef>
 #include <cstdint>
 

@@ -16,4 +16,9 @@ void XQueryErrorTrace::addCall(XQueryTracedCall call) {
   ++_leftOut;
 }
 
+Ref<XQueryError> XQueryErrorTrace::error(const XQueryError& error,
+                                         Ref<XQueryErrorTrace> withTrace) {
+  return make<XQueryError>(error, error._moduleURL, std::move(withTrace));
+}
+
 }  // namespace xquery

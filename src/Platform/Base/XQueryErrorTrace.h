@@ -29,8 +29,12 @@ class XQueryErrorTrace : public NSCounted {
   Ref<XQueryErrorTrace> copy() const;
   // The trace of an error; null when it has none.
   static const XQueryErrorTrace* of(const XQueryError& error) {
-    return static_cast<const XQueryErrorTrace*>(error._trace());
+    return static_cast<const XQueryErrorTrace*>(error._placeAndCalls.get());
   }
+
+  // The same error with that trace, or with none.
+  [[nodiscard]] static Ref<XQueryError> error(const XQueryError& error,
+                                              Ref<XQueryErrorTrace> withTrace);
 
   const XQueryPlaces& places() const { return *_places; }
   XQueryPlaceNumber place() const { return _place; }

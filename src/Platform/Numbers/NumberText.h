@@ -4,6 +4,7 @@
 #include "xquery/Number.h"
 
 #include <cstdint>
+#include <string>
 
 namespace xquery {
 
@@ -25,5 +26,12 @@ bool findNumber(NSStringView text, NumberExtent& extent);
 uint32_t hashDouble(double value);
 // Of every digit: decimals that are equal as doubles differ in it.
 uint64_t hashDigits(const NSDecimal& value);
+
+// Scans a double by the same rule as NSDecimal::scan. "inf", "nan" and hexadecimal forms are not
+// numbers; what overflows becomes an infinity.
+bool scanDouble(NSStringView text, double& out);
+// The printing rule of `stringValue` for a finite double or float.
+std::string formatDouble(double value);
+std::string formatFloat(float value);
 
 }  // namespace xquery

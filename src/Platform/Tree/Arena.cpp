@@ -8,6 +8,7 @@
 #include "Platform/Tree/Credit.h"
 #include "Platform/Tree/Names.h"
 #include "Platform/Tree/TreeExtra.h"
+#include "Platform/Tree/TreeHead.h"
 
 #include <algorithm>
 #include <atomic>
@@ -435,6 +436,7 @@ void NSXMLTree::absorb(NSXMLTree* smaller) {
   smaller->_lastBlock->next = first;
   setBlockCount(uint64_t{blockCount()} + smaller->blockCount());
   _era = std::min(_era, smaller->_era);
+  _hasFrozen |= smaller->_hasFrozen;
   const uint64_t sum = uint64_t{references} + smaller->references;
   references = sum >= immortalBit ? immortalBit : static_cast<uint32_t>(sum);
   NSCounted::operator delete(smaller, sizeof(NSXMLTree));
@@ -504,6 +506,19 @@ void NSXMLTree::noteTakenIn(const NSXMLNode* parent, const NSXMLNode* node) {
   }
 }
 
+bool NSXMLTree::freeze(NSXMLDocument* document) {
+  NSXMLTree* const tree = of(document);
+  if (tree->hasSeveralRoots()) return false;
+  document->_flags |= frozen;
+  tree->_hasFrozen = true;
+  tree->becomeOld();
+  return true;
+}
+
+bool NSXMLTree::hasFrozenRoot(const NSXMLNode* node) {
+  return (node->rootNode()->_flags & frozen) != 0;
+}
+
 bool NSXMLTree::isRootAbove(const NSXMLNode* node, const NSXMLNode* root) {
   return of(node) == of(root) && node->rootNode() == root;
 }
@@ -513,7 +528,7 @@ bool NSXMLTree::adoptChild(NSXMLNode* parent, NSXMLNode* child, NSXMLNode* befor
       isFixed(child)) {
     return false;
   }
-  if (isRootAbove(parent, child)) return false;
+  if (isFrozen(parent) || isRootAbove(parent, child)) return false;
   insertChild(parent, child, before);
   return true;
 }
@@ -631,7 +646,7 @@ void NSXMLTree::makeOrderFresh(const NSXMLNode* root) {
   }
 }
 
-bool NSXMLNode::makeOrderComparable(const NSXMLNode* a, const NSXMLNode* b) {
+bool NSXMLNodeOrder::makeComparable(const NSXMLNode* a, const NSXMLNode* b) {
   NSXMLTree* tree = NSXMLTree::of(a);
   const NSXMLNode* root = a->rootNode();
   if (__atomic_load_n(&tree->order, __ATOMIC_ACQUIRE) == NSXMLTreeHead::SeveralRoots) {
@@ -643,7 +658,7 @@ bool NSXMLNode::makeOrderComparable(const NSXMLNode* a, const NSXMLNode* b) {
 }
 
 int NSXMLNode::compareOrder(const NSXMLNode* a, const NSXMLNode* b) {
-  if (a == b || !haveComparableOrder(a, b)) return 0;
+  if (a == b || !NSXMLNodeOrder::areComparable(a, b)) return 0;
   return a->_word < b->_word ? -1 : 1;
 }
 

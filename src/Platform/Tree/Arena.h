@@ -18,6 +18,7 @@
 // TreeBuilder.h. All blocks are in the range that nodes refer to each other in.
 #pragma once
 
+#include "Platform/Tree/TreeHead.h"
 #include "xquery/XMLNode.h"
 
 #include <atomic>
@@ -170,7 +171,8 @@ class NSXMLTree : public NSXMLTreeHead {
   // Whether a constructor that makes `parent` may put the node itself there and not a copy: a root
   // that was made in this era, belongs to nobody else, and is not above `parent`.
   static bool mayMoveTo(const NSXMLNode* parent, const NSXMLNode* node) {
-    return !node->_parent && !isFixed(node) && isNew(node) && !isRootAbove(parent, node);
+    return !node->_parent && !isFixed(node) && !isFrozen(node) && isNew(node) &&
+           !isRootAbove(parent, node);
   }
   // Before a constructor that makes `parent` puts such a node there. Nodes that are made in place
   // are roots of their own as long as they are being filled, which nobody can tell before they take
@@ -232,6 +234,15 @@ class NSXMLTree : public NSXMLTreeHead {
   // A fixed node is never adopted nor changed: several threads may be using it.
   static void setFixed(NSXMLNode* node) { node->_flags |= NSXMLNode::Fixed; }
   static bool isFixed(const NSXMLNode* node) { return (node->_flags & NSXMLNode::Fixed) != 0; }
+
+  // A frozen document, and all that is in it, is never changed; other roots of the tree may be.
+  // Answer: whether the document is the only root of its tree, without which it is not frozen, as
+  // a change of another root might move its memory to another tree.
+  static bool freeze(NSXMLDocument* document);
+  // Of the node's root.
+  static bool isFrozen(const NSXMLNode* node) {
+    return of(node)->_hasFrozen && hasFrozenRoot(node);
+  }
 
   // The number of a root whose subtree's numbers are good, as they are assigned; and of a root
   // whose subtree's numbers are not good, where the tree has several roots.
@@ -307,9 +318,11 @@ class NSXMLTree : public NSXMLTreeHead {
   static void unlink(NSXMLNode* node);
   static void renumber(const NSXMLNode* root);
 
-  // A bit of a node's flags beside those of NSXMLNode::Flag, which others may look at: this one is
+  // Bits of a node's flags beside those of NSXMLNode::Flag, which others may look at: the first is
   // only ever set while nobody but the thread that makes the node knows it.
   static constexpr uint8_t unfinished = 1U << 7;
+  static constexpr uint8_t frozen = 1U << 6;  // of a document
+  static bool hasFrozenRoot(const NSXMLNode* node);
 
   uint8_t blockCountHigh = 0;  // saturates; only compared
   uint16_t blockCountLow = 0;
@@ -321,8 +334,9 @@ class NSXMLTree : public NSXMLTreeHead {
   uintptr_t _extra = 0;
   NSXMLBaseURI* _baseURIs = nullptr;
   std::atomic<NSXMLTreeIndexes*> _indexes = nullptr;  // made when they pay, see TreeIndexes.h
-  uint64_t _era : 63 =
+  uint64_t _era : 62 =
       NSXMLEra::current();                // in which it was made; of merged trees the older one's
+  uint64_t _hasFrozen : 1 = false;        // perhaps: a frozen document is a root of it
   uint64_t _baseURIsAreAlike : 1 = true;  // of one owner, with one URI
 };
 

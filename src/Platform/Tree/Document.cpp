@@ -18,7 +18,7 @@ Ref<NSString> NSXMLDocument::documentURI() const {
 }
 
 void NSXMLDocument::setURI(const Ref<NSString>& URI) {
-  NSXMLTree::of(this)->setURI(this, URI.get());
+  if (!NSXMLTree::isFrozen(this)) NSXMLTree::of(this)->setURI(this, URI.get());
 }
 
 bool NSXMLDocument::addChild(const Ref<NSXMLNode>& child) {

@@ -40,7 +40,7 @@ NSXMLNode* NSXMLElement::attributeForLocalName(NSStringView localName, NSStringV
 
 bool NSXMLElement::addAttribute(const Ref<NSXMLNode>& attribute) {
   if (!attribute || attribute->kind() != Kind::Attribute || attribute->parent() ||
-      attributeForName(attribute->nameView())) {
+      attributeForName(attribute->nameView()) || NSXMLTree::isFrozen(this)) {
     return false;
   }
   NSXMLTree::appendProperty(this, attribute.get());
@@ -49,6 +49,7 @@ bool NSXMLElement::addAttribute(const Ref<NSXMLNode>& attribute) {
 
 bool NSXMLElement::addNamespace(const Ref<NSXMLNode>& node) {
   if (!node || node->kind() != Kind::Namespace || node->parent()) return false;
+  if (NSXMLTree::isFrozen(this)) return false;
   WorkPacer pacer;
   for (const NSXMLNode* present = firstNamespace(); present; present = nextNamespace(present)) {
     pacer.turn();

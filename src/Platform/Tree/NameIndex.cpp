@@ -3,6 +3,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeHead.h"
 
 #include <algorithm>
 #include <iterator>
@@ -306,7 +307,7 @@ NSXMLNodeList NSXMLNameIndex::nodes(const NSXMLNameSelection& selection, const N
   WorkPacer pacer;
   const auto isBefore = [&pacer](const NSXMLNode* a, const NSXMLNode* b) {
     pacer.turn();
-    return a->orderNumber() < b->orderNumber();
+    return NSXMLNodeOrder::number(*a) < NSXMLNodeOrder::number(*b);
   };
   NSXMLNodeList found;
   NSXMLNodeList merged;
@@ -354,9 +355,10 @@ NSXMLNodeSpan NSXMLNameIndex::between(NSXMLNodeSpan nodes, const NSXMLNode* firs
                                       const NSXMLNode* stop) {
   const auto placeOf = [](NSXMLNodeSpan among, const NSXMLNode* node) {
     const auto isBefore = [](const NSXMLNode* a, uint32_t number) {
-      return a->orderNumber() < number;
+      return NSXMLNodeOrder::number(*a) < number;
     };
-    const auto found = std::lower_bound(among.begin(), among.end(), node->orderNumber(), isBefore);
+    const auto found =
+        std::lower_bound(among.begin(), among.end(), NSXMLNodeOrder::number(*node), isBefore);
     return static_cast<size_t>(found - among.begin());
   };
   const NSXMLNodeSpan rest = nodes.subspan(placeOf(nodes, first));

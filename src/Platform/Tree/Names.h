@@ -43,6 +43,25 @@ void NSXMLReleaseName(const NSXMLExpandedName* name);
 void NSXMLAddReferences(const NSXMLName* name, uint32_t count);
 void NSXMLRemoveReferences(const NSXMLName* name, uint32_t count);
 
+// An interned expanded name. The returned pointer stays valid while a handle to it lives.
+class NSXMLExpandedNameRef {
+ public:
+  NSXMLExpandedNameRef() = default;
+  // An empty URI is no namespace.
+  NSXMLExpandedNameRef(NSStringView URI, NSStringView localName);
+  // Another handle to a name that somebody has one to, or a node carries.
+  explicit NSXMLExpandedNameRef(const NSXMLExpandedName* name);
+  NSXMLExpandedNameRef(const NSXMLExpandedNameRef& other);
+  NSXMLExpandedNameRef(NSXMLExpandedNameRef&& other) noexcept;
+  NSXMLExpandedNameRef& operator=(NSXMLExpandedNameRef other) noexcept;
+  ~NSXMLExpandedNameRef();
+  const NSXMLExpandedName* get() const { return _name; }
+  explicit operator bool() const { return _name != nullptr; }
+
+ private:
+  const NSXMLExpandedName* _name = nullptr;
+};
+
 // A count of a qualified name, or null.
 class NSXMLNameRef {
  public:

@@ -181,7 +181,7 @@ void NSXMLNode::appendStringValueTo(NSMutableString& out) const {
 // --- changes ---------------------------------------------------------------------------------
 
 void NSXMLNode::setStringValue(NSStringView text) {
-  if (NSXMLTree::isFixed(this)) return;
+  if (NSXMLTree::isFixed(this) || NSXMLTree::isFrozen(this)) return;
   if (!isBranch()) {
     NSXMLTree::noteTextChange(this);
     tree()->setText(this, text);
@@ -193,7 +193,7 @@ void NSXMLNode::setStringValue(NSStringView text) {
 }
 
 void NSXMLNode::detach() {
-  if (_parent) NSXMLTree::detach(this);
+  if (_parent && !NSXMLTree::isFrozen(this)) NSXMLTree::detach(this);
 }
 
 // --- factories -------------------------------------------------------------------------------

@@ -4,6 +4,7 @@
 #include "Platform/Base/RangeMemory.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/Blocks.h"
+#include "Platform/Tree/TreeHead.h"
 
 #include <algorithm>
 

@@ -6,6 +6,7 @@
 #pragma once
 
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/TreeHead.h"
 
 #include <cstring>
 #include <new>

@@ -2,6 +2,7 @@
 
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/TreeHead.h"
 
 #include <new>
 
@@ -22,7 +23,7 @@ uint32_t numberOfLast(const NSXMLNode* root) {
     pacer.turn();
     last = child;
   }
-  return last->orderNumber();
+  return NSXMLNodeOrder::number(*last);
 }
 
 }  // namespace
@@ -190,11 +191,11 @@ struct IndexesForWalk {
 
 IndexesForWalk indexesForWalk(const NSXMLNode* first, const NSXMLNode* stop) {
   if (!NSXMLTree::of(first)->isOrderFresh()) return {};
-  const uint32_t number = first->orderNumber();
-  if (stop && stop->orderNumber() - number < NSXMLTreeIndexes::fewNodes) return {};
+  const uint32_t number = NSXMLNodeOrder::number(*first);
+  if (stop && NSXMLNodeOrder::number(*stop) - number < NSXMLTreeIndexes::fewNodes) return {};
   NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(first);
   if (!indexes) return {};
-  const uint32_t work = (stop ? stop->orderNumber() : indexes->lastNumber() + 1) - number;
+  const uint32_t work = (stop ? NSXMLNodeOrder::number(*stop) : indexes->lastNumber() + 1) - number;
   if (work < NSXMLTreeIndexes::fewNodes) return {};
   return {std::move(indexes), work};
 }

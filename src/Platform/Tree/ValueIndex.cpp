@@ -2,6 +2,7 @@
 
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/Names.h"
 
 #include <algorithm>
 

@@ -14,6 +14,7 @@
 #pragma once
 
 #include "Platform/Tree/NameIndex.h"
+#include "Platform/Tree/Names.h"
 
 #include <memory>
 #include <utility>

@@ -18,7 +18,7 @@ class ClauseItems : public BindingTesting {
   std::string itemsOf(const Ref<XQueryExpr>& expr, bool flattens = true) {
     return outcome([&](XQueryContext& with) {
       XQueryClauseItems items(expr.get(), with);
-      if (items.haveFailed()) with._internal().throwFailure();
+      if (items.haveFailed()) _internal(with).throwFailure();
       if (flattens) items.flatten();
       std::vector<Value> values;
       for (size_t i = 0; i < items.count(); ++i) values.push_back(items[i]);

@@ -522,7 +522,7 @@ TEST_F(FLWOR, TheOrderingModeHoldsForTheOperandOnly) {
     for (const bool inside : {true, false}) {
       dynamic().setOrdered(outside);
       const auto mode =
-          probe([](XQueryContext& with) { return boolean(with._internal().ordered()); });
+          probe([](XQueryContext& with) { return boolean(_internal(with).ordered()); });
       EXPECT_EQ(outcomeOf(XQueryOrderExpr::orderExpr(mode, inside)), inside ? "true" : "false");
       EXPECT_EQ(dynamic().ordered(), outside);
     }

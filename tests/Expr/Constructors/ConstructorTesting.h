@@ -9,6 +9,7 @@
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
 #include "xquery/Collection.h"
+#include "xquery/Exception.h"
 #include "xquery/XMLNode.h"
 #include "xquery/XQuery.h"
 
@@ -37,8 +38,8 @@ class Constructors : public testing::Test {
     Value _value;
   };
 
-  Constructors() { context->_internal().setActiveProlog(prolog.get()); }
-  ~Constructors() override { context->_internal().setActiveProlog(nullptr); }
+  Constructors() { _internal(*context).setActiveProlog(prolog.get()); }
+  ~Constructors() override { _internal(*context).setActiveProlog(nullptr); }
 
   static Ref<NSString> text(std::string_view utf8) { return NSString::stringWithUTF8(utf8); }
   static NSStringView view(std::string_view ascii) { return NSStringView::ascii(ascii); }
@@ -71,7 +72,7 @@ class Constructors : public testing::Test {
     try {
       evaluated(expr);
     } catch (const NSException&) {
-      const auto& error = context->_internal().error();
+      const auto& error = _internal(*context).error();
       return std::to_string(error->err()) + " " + std::to_string(error->line()) + " " +
              error->msg()->utf8();
     }

@@ -1,6 +1,7 @@
 #include "Expr/Constructors/ConstructorTesting.h"
 #include "Expr/Constructors/XQueryAttributeExpr.h"
 #include "Platform/Base/WorkMeter.h"
+#include "xquery/Exception.h"
 
 namespace xquery {
 namespace {
@@ -51,7 +52,7 @@ TEST_F(AttributeExpr, WhiteSpaceBecomesSpacesInTheWholeValue) {
 
 TEST_F(AttributeExpr, AnUnprefixedNameIsInNoNamespace) {
   prolog->setDefaultElementNamespace(text("urn:d"));
-  context->_internal().addNamespace(text("urn:c"), text(""));
+  _internal(*context).addNamespace(text("urn:c"), text(""));
   EXPECT_TRUE(cast<NSXMLNode>(evaluated(*direct("a")))->URIView().isEmpty());
 }
 
@@ -66,7 +67,7 @@ TEST_F(AttributeExpr, APrefixThatDoesNotResolveWaitsForTheContext) {
   const auto expr = direct("p:a");
   expr->setExprLine(2);
   EXPECT_EQ(errorOf(*expr), "1 3 can't resolve QName for \"p:a\"");
-  context->_internal().addNamespace(text("urn:p"), text("p"));
+  _internal(*context).addNamespace(text("urn:p"), text("p"));
   EXPECT_EQ(cast<NSXMLNode>(expr->evaluateWithContext(*context))->URIView(), "urn:p");
 }
 
@@ -80,8 +81,8 @@ TEST_F(AttributeExpr, InALibraryModuleAPrefixThatDoesNotResolveIsAnError) {
 TEST_F(AttributeExpr, WithoutANameThereIsNoAttribute) {
   const auto expr = XQueryAttributeExpr::attributeExprWithName(text("a"), {}, u'"');
   EXPECT_THROW(evaluatedOrThrown(*expr, *context), NSException) << "it was never bound";
-  EXPECT_EQ(context->_internal().error()->msg()->utf8(), "can't resolve QName for \"a\"");
-  EXPECT_EQ(context->_internal().error()->err(), 1);
+  EXPECT_EQ(_internal(*context).error()->msg()->utf8(), "can't resolve QName for \"a\"");
+  EXPECT_EQ(_internal(*context).error()->err(), 1);
 }
 
 TEST_F(AttributeExpr, NamesOfDeclarationsAreRefused) {

@@ -4,6 +4,7 @@
 #include "Expr/Constructors/XQueryElementExpr.h"
 #include "Expr/Constructors/XQueryNodeExprs.h"
 #include "Platform/Base/ProcessorTime.h"
+#include "xquery/Exception.h"
 
 #include <memory>
 #include <thread>
@@ -81,7 +82,7 @@ TEST_F(ElementExpr, InAMainModuleANameThatDoesNotResolveWaits) {
   EXPECT_EQ(errorOf(*expr), "1 4 can't resolve QName for \"p:a\"");
   EXPECT_EQ(prolog->qNameReferences().size(), 1u);
   EXPECT_TRUE(prolog->errors().empty());
-  context->_internal().addNamespace(text("urn:p"), text("p"));
+  _internal(*context).addNamespace(text("urn:p"), text("p"));
   const Value value = expr->evaluateWithContext(*context);
   EXPECT_EQ(cast<NSXMLElement>(value)->nameView().utf8(), "a") << "keeps no prefix";
   EXPECT_EQ(cast<NSXMLElement>(value)->URIView().utf8(), "urn:p");
@@ -100,7 +101,7 @@ TEST_F(ElementExpr, InALibraryModuleANameThatDoesNotResolveIsAnError) {
 
 TEST_F(ElementExpr, InALibraryModuleANameWithoutPrefixIsInNoNamespace) {
   prolog->setModulePrefix(text("m"));
-  context->_internal().addNamespace(text("urn:d"), text(""));
+  _internal(*context).addNamespace(text("urn:d"), text(""));
   EXPECT_EQ(made(*direct("a"))->URIView().utf8(), "");
 }
 
@@ -108,9 +109,9 @@ TEST_F(ElementExpr, ANameThatWaitsMayGetADefaultNamespaceLater) {
   const auto expr = direct("a");
   EXPECT_EQ(made(*expr)->URIView().utf8(), "");
   EXPECT_EQ(prolog->qNameReferences().size(), 1u);
-  context->_internal().addNamespace(text("urn:d"), text(""));
+  _internal(*context).addNamespace(text("urn:d"), text(""));
   EXPECT_EQ(cast<NSXMLElement>(expr->evaluateWithContext(*context))->URIView().utf8(), "urn:d");
-  context->_internal().addNamespace(nullptr, text(""));
+  _internal(*context).addNamespace(nullptr, text(""));
   EXPECT_EQ(cast<NSXMLElement>(expr->evaluateWithContext(*context))->URIView().utf8(), "");
 }
 
@@ -163,8 +164,8 @@ TEST_F(ElementExpr, NamespacesGoWhenAnErrorEndsTheConstructor) {
   const auto expr = direct("q:a", {XQueryCommentExpr::commentExprWithValue(string("--"))},
                            {declaration("p", "urn:p"), attribute("q:b", "1")});
   EXPECT_EQ(errorOf(*expr), "72 1 invalid comment");
-  EXPECT_FALSE(context->_internal().inScopeNamespaceForPrefix(view("p")));
-  EXPECT_FALSE(context->_internal().inScopeNamespaceForPrefix(view("q")));
+  EXPECT_FALSE(_internal(*context).inScopeNamespaceForPrefix(view("p")));
+  EXPECT_FALSE(_internal(*context).inScopeNamespaceForPrefix(view("q")));
 }
 
 TEST_F(ElementExpr, NamespacesOfAFormerParentAreKeptWhereTheyAreNotInherited) {
@@ -405,7 +406,7 @@ TEST_F(ElementExpr, NestingIsBoundedByTheStackWhileEvaluating) {
         expr);
   }
   EXPECT_THROW(evaluatedOrThrown(*expr, *context), NSException);
-  EXPECT_EQ(context->_internal().error()->msg()->utf8(), "limit: expression nested too deeply");
+  EXPECT_EQ(_internal(*context).error()->msg()->utf8(), "limit: expression nested too deeply");
 }
 
 // Each attribute declares a prefix of its own.

@@ -1,5 +1,6 @@
 #include "Expr/Constructors/ConstructorTesting.h"
 #include "Expr/Constructors/XQueryNodeExprs.h"
+#include "xquery/Exception.h"
 
 namespace xquery {
 namespace {
@@ -146,7 +147,7 @@ TEST_F(NodeExprs, ReservedPrefixesAreRefused) {
 
 TEST_F(NodeExprs, DocumentsElementsAndInstructionsRecordTheBaseURI) {
   prolog->setBaseURI(text("http://b/"));
-  auto& dynamic = context->_internal();
+  auto& dynamic = _internal(*context);
   const Value node = evaluated(*document(NSNull::null()));
   EXPECT_EQ(dynamic.baseURIForNode(cast<NSXMLNode>(node))->utf8(), "http://b/");
   const Value instruction = evaluated(*pi(text("p"), NSNull::null()));
@@ -169,7 +170,7 @@ TEST_F(NodeExprs, NestingIsBoundedByTheStack) {
   // Binding may need no stack at all, where its last call is a jump; evaluating always does.
   EXPECT_LE(prolog->errors().size(), 1U);
   EXPECT_THROW(evaluatedOrThrown(*expr, *context), NSException);
-  EXPECT_EQ(context->_internal().error()->msg()->utf8(), "limit: expression nested too deeply");
+  EXPECT_EQ(_internal(*context).error()->msg()->utf8(), "limit: expression nested too deeply");
 }
 
 }  // namespace

@@ -12,6 +12,7 @@
 #include "Types/XQueryValues.h"
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
+#include "xquery/Exception.h"
 #include "xquery/XMLNode.h"
 #include "xquery/XQuery.h"
 
@@ -103,7 +104,7 @@ std::string outcome(Work work) {
   try {
     return show(work(*context));
   } catch (const NSException& exception) {
-    const Ref<XQueryError>& error = context->_internal().error();
+    const Ref<XQueryError>& error = _internal(*context).error();
     if (!error) return "exception " + exception.name();
     return "error " + std::to_string(error->err()) + " " + error->msg()->utf8();
   }

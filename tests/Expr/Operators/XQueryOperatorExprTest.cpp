@@ -6,6 +6,7 @@
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
+#include "xquery/Exception.h"
 
 #include <gtest/gtest.h>
 
@@ -109,7 +110,7 @@ TEST(OperatorDispatch, ErrorsOfTheClassMethodsHaveNoLine) {
   EXPECT_THROW((void)XQueryOperatorExpr::evaluateOperator(XQueryOperatorPlus, string("a"),
                                                           integer(1), *context),
                NSException);
-  EXPECT_EQ(context->_internal().error()->line(), 0);
+  EXPECT_EQ(_internal(*context).error()->line(), 0);
 }
 
 TEST(OperatorExpr, KeepsItsOperands) {
@@ -149,7 +150,7 @@ TEST(OperatorExpr, InvalidOperandsAreReportedAtTheLineOfTheOperator) {
   expr->setExprLine(4);
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
   EXPECT_THROW((void)evaluatedOrThrown(*expr, *context), NSException);
-  const Ref<XQueryError>& error = context->_internal().error();
+  const Ref<XQueryError>& error = _internal(*context).error();
   ASSERT_TRUE(error);
   EXPECT_EQ(error->err(), 6);
   EXPECT_EQ(error->msg()->utf8(), "invalid type for operator");
@@ -161,8 +162,8 @@ TEST(OperatorExpr, AnErrorRecordIsReportedAtTheLineOfTheOperator) {
   expr->setExprLine(2);
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
   EXPECT_THROW((void)evaluatedOrThrown(*expr, *context), NSException);
-  EXPECT_EQ(context->_internal().error()->msg()->utf8(), "Division by zero");
-  EXPECT_EQ(context->_internal().error()->line(), 3);
+  EXPECT_EQ(_internal(*context).error()->msg()->utf8(), "Division by zero");
+  EXPECT_EQ(_internal(*context).error()->line(), 3);
 }
 
 TEST(OperatorExpr, AMissingOperandValueIsInvalid) {
@@ -277,8 +278,8 @@ TEST(ComparisonWithRange, BadBoundsFailAtTheLineOfTheRange) {
   const auto expr = binary(XQueryOperatorEqual, literal(integer(5)), bounds);
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
   EXPECT_THROW((void)evaluatedOrThrown(*expr, *context), NSException);
-  EXPECT_EQ(context->_internal().error()->msg()->utf8(), "invalid type for operator");
-  EXPECT_EQ(context->_internal().error()->line(), 8);
+  EXPECT_EQ(_internal(*context).error()->msg()->utf8(), "invalid type for operator");
+  EXPECT_EQ(_internal(*context).error()->line(), 8);
 }
 
 TEST(ComparisonWithRange, AnItemThatCannotBeAtomizedFailsBeforeAnyPairAnswers) {

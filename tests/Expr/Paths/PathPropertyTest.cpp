@@ -11,6 +11,7 @@
 #include "Plan/Plan.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryNumber.h"
+#include "xquery/Exception.h"
 
 #include <algorithm>
 #include <random>
@@ -62,7 +63,7 @@ class PlainPath {
     const bool isReverse = step.axis >= 8;
     const bool isLast = index + 1 == _steps.size();
     for (NSXMLNode* item : items) {
-      _context._internal().setContextItem(item, 0);
+      _internal(_context).setContextItem(item, 0);
       if (step.predicates.empty()) {
         for (NSXMLNode* node : plainAxis(item, step.axis)) {
           if (!XQueryAxisStep::isValid(node, step.test.get(), _context)) continue;
@@ -97,7 +98,7 @@ class PlainPath {
       if (n >= 1 && n <= nodes.size()) kept.push_back(nodes[n - 1]);
       return kept;
     }
-    auto& focus = _context._internal();
+    auto& focus = _internal(_context);
     focus.setLast(static_cast<int64_t>(nodes.size()));
     for (size_t p = 1; p <= nodes.size(); ++p) {
       focus.setContextItem(nodes[p - 1], static_cast<int64_t>(p));
@@ -129,7 +130,7 @@ class PathProperty : public PathTesting {
     prolog->addPrefix(text("q"), text("urn:q"));
   }
   std::string focus() {
-    const auto& dynamic = context->_internal();
+    const auto& dynamic = _internal(*context);
     return shownList(nodesOf(dynamic.contextItem())) + std::to_string(dynamic.position()) + "/" +
            std::to_string(dynamic.last());
   }
@@ -226,14 +227,14 @@ TEST_F(PathProperty, BothWaysAgreeWithCompleteLists) {
     Steps steps = {filterStep(always(array({items.begin(), items.end()})))};
     for (const auto& each : plain) steps.push_back(step(each.axis, each.test, each.predicates));
 
-    context->_internal().setOrdered(ordered);
+    _internal(*context).setOrdered(ordered);
     const auto expr = path(steps);
     expr->bindInfoForProlog(*prolog);
     const NodeList expected = PlainPath(plain, *context).evaluate(items, ordered);
     for (const bool isPlanned : {false, true}) {
       const Ref<XQueryExpr> way = isPlanned ? XQueryPlanned(*prolog, expr) : expr;
       focusOn(document, 4);
-      context->_internal().setLast(8);
+      _internal(*context).setLast(8);
       const std::string before = focus();
       const Value answer = evaluatedOrThrown(*way, *context);
       EXPECT_EQ(focus(), before) << seed;
@@ -261,7 +262,7 @@ TEST_F(PathProperty, AnErrorLeavesTheFocusOfTheLongWay) {
     const auto expr = path(steps);
     expr->bindInfoForProlog(*prolog);
     focusOn(start);
-    context->_internal().setLast(1);
+    _internal(*context).setLast(1);
     const std::string expectedError =
         errorOf([&] { PlainPath(plain, *context).evaluate({start}, true); });
     const std::string expectedFocus = focus();
@@ -269,7 +270,7 @@ TEST_F(PathProperty, AnErrorLeavesTheFocusOfTheLongWay) {
     for (const bool isPlanned : {false, true}) {
       const Ref<XQueryExpr> way = isPlanned ? XQueryPlanned(*prolog, expr) : expr;
       focusOn(start);
-      context->_internal().setLast(1);
+      _internal(*context).setLast(1);
       const std::string error = errorOf([&] { evaluatedOrThrown(*way, *context); });
       ASSERT_EQ(error, expectedError) << seed;
       ASSERT_TRUE(error.empty() || focus() == expectedFocus) << seed << " " << isPlanned;

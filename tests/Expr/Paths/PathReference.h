@@ -231,18 +231,18 @@ class PathGenerator {
         return integer(std::to_string(below(4)));
       case 2:
         return probe([](XQueryContext& c) -> Value {
-          return XQueryNumber::integerWithInt64(c._internal().last());
+          return XQueryNumber::integerWithInt64(_internal(c).last());
         });
       case 3:  // fails for every third position
         return probe([](XQueryContext& c) -> Value {
-          if (c._internal().position() % 3 == 0) {
-            c._internal().raise(XQueryError::error(6, "invalid type"));
+          if (_internal(c).position() % 3 == 0) {
+            _internal(c).raise(XQueryError::error(6, "invalid type"));
           }
           return NSNumber::trueValue();
         });
       case 4:
         return probe([](XQueryContext& c) -> Value {
-          return NSNumber::numberWithBool(c._internal().position() != c._internal().last());
+          return NSNumber::numberWithBool(_internal(c).position() != _internal(c).last());
         });
       default:  // looks at the tree through a path of its own
         return path({step(XQueryAxisChild, anyNode())});

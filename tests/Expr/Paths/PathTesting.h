@@ -12,6 +12,7 @@
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
 #include "xquery/Collection.h"
+#include "xquery/Exception.h"
 #include "xquery/XMLNode.h"
 #include "xquery/XQuery.h"
 
@@ -134,7 +135,7 @@ inline NSXMLNode* byID(const NSXMLNode* root, std::string_view id) {
 class PathTesting : public testing::Test {
  protected:
   void focusOn(const Value& item, int64_t position = 1) {
-    context->_internal().setContextItem(item, position);
+    _internal(*context).setContextItem(item, position);
   }
   // Binds in a main module and evaluates.
   Value evaluate(const Ref<XQueryExpr>& expr) {
@@ -155,7 +156,7 @@ class PathTesting : public testing::Test {
       action();
     } catch (const NSException& exception) {
       EXPECT_EQ(exception.name(), "XQueryError");
-      const auto& error = context->_internal().error();
+      const auto& error = _internal(*context).error();
       return std::to_string(error->err()) + ": " + error->msg()->utf8();
     }
     return "";

@@ -112,7 +112,7 @@ TEST_F(NameTest, AnUnknownPrefixInAMainModuleIsLookedUpInTheContext) {
   const auto test = bound("u:a", *mainModule());
   EXPECT_TRUE(test->isDeferred());
   EXPECT_EQ(errorOf([&] { matching(*test); }), "1: can't resolve QName for \"u:a\"");
-  EXPECT_EQ(context->_internal().error()->line(), 5);
+  EXPECT_EQ(_internal(*context).error()->line(), 5);
   context = XQueryContext::xqueryContextWithNamespaces({{"u", "urn:x"}});
   EXPECT_EQ(matching(*test), "x:a ");
 }

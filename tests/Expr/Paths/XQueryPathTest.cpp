@@ -24,7 +24,7 @@ class Path : public PathTesting {
   }
   // The nodes on the axis in the order in which the walk finds them.
   std::string walked(const Value& item, int axis) {
-    context->_internal().setOrdered(false);
+    _internal(*context).setOrdered(false);
     return shownFrom(item, {step(axis, anyNode())});
   }
 
@@ -291,7 +291,7 @@ TEST_F(Path, SiblingsYieldTheirParentOnce) {
 
 TEST_F(Path, UnorderedResultsKeepTheOrderOfTheWalkWithoutDuplicates) {
   const Steps everyChild = {rootStep(), anyDepth(), step(XQueryAxisChild, anyName())};
-  context->_internal().setOrdered(false);
+  _internal(*context).setOrdered(false);
   EXPECT_EQ(shownFrom(document, everyChild), "r a1 a2 pi(p) e1 b1 b2 c1 d1 f1 f2 g1");
   const Steps ancestors = {rootStep(), anyDepth(), child("f"),
                            step(XQueryAxisAncestorOrSelf, anyName())};
@@ -339,7 +339,7 @@ TEST_F(Path, AFirstStepThatYieldsAnAtomicValueStopsTheAxisStepAfterIt) {
 TEST_F(Path, AFilterStepSeesEachItemWithItsPositionAndTheSize) {
   std::string seen;
   const auto noting = probe([&](XQueryContext& c) -> Value {
-    auto& focus = c._internal();
+    auto& focus = _internal(c);
     seen += shown(focus.contextItem()) + ":" + std::to_string(focus.position()) + "/" +
             std::to_string(focus.last()) + " ";
     return NSNull::null();
@@ -358,7 +358,7 @@ TEST_F(Path, AFilterStepSeesEachItemWithItsPositionAndTheSize) {
 
 TEST_F(Path, AFilterStepAtTheEndMayGiveAtomicValues) {
   const auto freshValue =
-      probe([](XQueryContext& c) -> Value { return text(shown(c._internal().contextItem())); });
+      probe([](XQueryContext& c) -> Value { return text(shown(_internal(c).contextItem())); });
   EXPECT_EQ(shownFrom(at("r"), {child("a"), filterStep(freshValue)}), "a1 a2");
 }
 
@@ -412,24 +412,24 @@ TEST_F(Path, NodesAndAtomicValuesDoNotMixInAResult) {
 
 TEST_F(Path, TheFocusIsRestoredAtTheEnd) {
   focusOn(document, 3);
-  context->_internal().setLast(9);
+  _internal(*context).setLast(9);
   EXPECT_EQ(shown(evaluate({rootStep(), anyDepth(), child("b", {always(text("x"))}),
                             filterStep(XQueryContextItem::contextItem())})),
             "b1 b2");
-  EXPECT_EQ(shown(context->_internal().contextItem()), "doc");
-  EXPECT_EQ(context->_internal().position(), 3);
-  EXPECT_EQ(context->_internal().last(), 9);
+  EXPECT_EQ(shown(_internal(*context).contextItem()), "doc");
+  EXPECT_EQ(_internal(*context).position(), 3);
+  EXPECT_EQ(_internal(*context).last(), 9);
 }
 
 TEST_F(Path, AnErrorLeavesTheFocusAsItWasWhenItWasRaised) {
-  context->_internal().setLast(9);
+  _internal(*context).setLast(9);
   EXPECT_EQ(errorOf([&] {
               evaluateFrom(at("r"), {child("a"), filterStep(failing())});
             }),
             "6: invalid type");
-  EXPECT_EQ(shown(context->_internal().contextItem()), "a1");
-  EXPECT_EQ(context->_internal().position(), 1);
-  EXPECT_EQ(context->_internal().last(), 1);
+  EXPECT_EQ(shown(_internal(*context).contextItem()), "a1");
+  EXPECT_EQ(_internal(*context).position(), 1);
+  EXPECT_EQ(_internal(*context).last(), 1);
 }
 
 TEST_F(Path, AnItemThatIsNoNodeLeavesTheFocusOfTheStepsBeforeIt) {
@@ -438,8 +438,8 @@ TEST_F(Path, AnItemThatIsNoNodeLeavesTheFocusOfTheStepsBeforeIt) {
               evaluateFrom(document, {filterStep(always(mixed)), child("a"), child("b")});
             }),
             "20: context item not a node");
-  EXPECT_EQ(shown(context->_internal().contextItem()), "a2");
-  EXPECT_EQ(context->_internal().position(), 0);
+  EXPECT_EQ(shown(_internal(*context).contextItem()), "a2");
+  EXPECT_EQ(_internal(*context).position(), 0);
 }
 
 TEST_F(Path, ANameThatDoesNotResolveLeavesTheContextItemOfItsStep) {
@@ -447,8 +447,8 @@ TEST_F(Path, ANameThatDoesNotResolveLeavesTheContextItemOfItsStep) {
               evaluateFrom(document, {rootStep(), child("r"), child("no:b")});
             }),
             "1: can't resolve QName for \"no:b\"");
-  EXPECT_EQ(shown(context->_internal().contextItem()), "r");
-  EXPECT_EQ(context->_internal().position(), 0);
+  EXPECT_EQ(shown(_internal(*context).contextItem()), "r");
+  EXPECT_EQ(_internal(*context).position(), 0);
 }
 
 // --- depth ---------------------------------------------------------------------------------------

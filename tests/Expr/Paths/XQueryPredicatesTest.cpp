@@ -11,7 +11,7 @@ class PredicatesTest : public PathTesting {
   std::string kept(const Value& items, Predicates predicates, size_t fromIndex = 0) {
     const auto holder = filterStep(nullptr, std::move(predicates));
     const Value value = holder->handlePreicatesFromIndex(fromIndex, items, *context);
-    if (XQueryHasFailed(value, *context)) context->_internal().throwFailure();
+    if (XQueryHasFailed(value, *context)) _internal(*context).throwFailure();
     return shown(value);
   }
   // Predicates over nodes, through a step.
@@ -21,22 +21,22 @@ class PredicatesTest : public PathTesting {
   // The position of the focus, as a number.
   static Ref<XQueryExpr> position() {
     return probe([](XQueryContext& c) -> Value {
-      return XQueryNumber::integerWithInt64(c._internal().position());
+      return XQueryNumber::integerWithInt64(_internal(c).position());
     });
   }
   static Ref<XQueryExpr> last() {
     return probe([](XQueryContext& c) -> Value {
-      return XQueryNumber::integerWithInt64(c._internal().last());
+      return XQueryNumber::integerWithInt64(_internal(c).last());
     });
   }
   static Ref<XQueryExpr> isLast() {
     return probe([](XQueryContext& c) -> Value {
-      return NSNumber::numberWithBool(c._internal().position() == c._internal().last());
+      return NSNumber::numberWithBool(_internal(c).position() == _internal(c).last());
     });
   }
   static Ref<XQueryExpr> whenItemIs(std::string_view id, Value then, Value otherwise) {
     return probe([=](XQueryContext& c) -> Value {
-      return shown(c._internal().contextItem()) == id ? then : otherwise;
+      return shown(_internal(c).contextItem()) == id ? then : otherwise;
     });
   }
   static Ref<XQueryExpr> listOf(Ref<XQueryExpr> element) {
@@ -95,11 +95,11 @@ TEST_F(PredicatesTest, AListOfOneLiteralIsThatLiteral) {
 
 TEST_F(PredicatesTest, ALiteralNumberLeavesTheFocusAlone) {
   focusOn(z, 5);
-  context->_internal().setLast(7);
+  _internal(*context).setLast(7);
   kept(xyz, {integer("2")});
-  EXPECT_EQ(context->_internal().contextItem(), z);
-  EXPECT_EQ(context->_internal().position(), 5);
-  EXPECT_EQ(context->_internal().last(), 7);
+  EXPECT_EQ(_internal(*context).contextItem(), z);
+  EXPECT_EQ(_internal(*context).position(), 5);
+  EXPECT_EQ(_internal(*context).last(), 7);
 }
 
 TEST_F(PredicatesTest, ALiteralStringIsEvaluatedForItsTruth) {
@@ -162,21 +162,21 @@ TEST_F(PredicatesTest, WhatIsKeptIsNormalised) {
 
 TEST_F(PredicatesTest, AnErrorDropsTheItemItAroseFor) {
   const auto failingForY = probe([this](XQueryContext& c) -> Value {
-    if (c._internal().contextItem() == y) {
-      c._internal().raise(XQueryError::error(6, "invalid type"));
+    if (_internal(c).contextItem() == y) {
+      _internal(c).raise(XQueryError::error(6, "invalid type"));
     }
     return yes;
   });
   EXPECT_EQ(kept(xyz, {failingForY}), "x z");
-  EXPECT_FALSE(context->_internal().error());
+  EXPECT_FALSE(_internal(*context).error());
   EXPECT_EQ(kept(xyz, {failing()}), "()");
   EXPECT_EQ(keptChildren("a", {failing()}), "()");
 }
 
 TEST_F(PredicatesTest, ADroppedItemKeepsItsPosition) {
   const auto failingForX = probe([this](XQueryContext& c) -> Value {
-    if (c._internal().contextItem() == x) {
-      c._internal().raise(XQueryError::error(6, "invalid type"));
+    if (_internal(c).contextItem() == x) {
+      _internal(c).raise(XQueryError::error(6, "invalid type"));
     }
     return XQueryNumber::integerWithInt64(2);
   });
@@ -185,7 +185,7 @@ TEST_F(PredicatesTest, ADroppedItemKeepsItsPosition) {
 
 TEST_F(PredicatesTest, AnEngineLimitIsNotSwallowed) {
   const auto late = probe(
-      [](XQueryContext& c) -> Value { c._internal().raise(XQueryErrors::deadlinePassed.error()); });
+      [](XQueryContext& c) -> Value { _internal(c).raise(XQueryErrors::deadlinePassed.error()); });
   EXPECT_EQ(errorOf([&] { kept(xyz, {late}); }), "0: limit: deadline passed");
 }
 
@@ -197,8 +197,8 @@ TEST_F(PredicatesTest, WhatOnlyReadsLikeALimitIsSwallowed) {
 TEST_F(PredicatesTest, TheSizeIsSetOnceForAllItems) {
   // A predicate that leaves another size behind is seen by the items after it.
   const auto spoiling = probe([](XQueryContext& c) -> Value {
-    const bool first = c._internal().last() == 3;
-    c._internal().setLast(1);
+    const bool first = _internal(c).last() == 3;
+    _internal(c).setLast(1);
     return NSNumber::numberWithBool(first);
   });
   EXPECT_EQ(kept(xyz, {spoiling}), "x");
@@ -206,9 +206,9 @@ TEST_F(PredicatesTest, TheSizeIsSetOnceForAllItems) {
 
 TEST_F(PredicatesTest, TheFocusStaysAtTheLastItem) {
   kept(xyz, {always(yes)});
-  EXPECT_EQ(context->_internal().contextItem(), z);
-  EXPECT_EQ(context->_internal().position(), 3);
-  EXPECT_EQ(context->_internal().last(), 3);
+  EXPECT_EQ(_internal(*context).contextItem(), z);
+  EXPECT_EQ(_internal(*context).position(), 3);
+  EXPECT_EQ(_internal(*context).last(), 3);
 }
 
 TEST_F(PredicatesTest, ALiteralPositionEndsTheWalkButChangesNoAnswer) {

@@ -146,11 +146,11 @@ TEST(AlongWays, LooksAtNoNodeThatIsOnlyCounted) {
         std::pair("count(//name[parent::person or parent::item])", "20001")}) {
     const auto query = compiled(text, XQueryWay::Planned);
     const auto context = XQueryContext::xqueryContext();
-    context->_internal().setContextItem(tree, 1);
+    _internal(*context).setContextItem(tree, 1);
     int64_t steps = 0;
     for (int turn = 0; turn < 12; ++turn) {
       const int64_t before = workMeter.stepsLeft;
-      const Value value = query->_internal().body()->evaluateWithContext(*context);
+      const Value value = _internal(*query).body()->evaluateWithContext(*context);
       steps = before - workMeter.stepsLeft;
       ASSERT_TRUE(value);
       EXPECT_EQ(XQueryItemStringValue(*value), expected) << text;

@@ -33,7 +33,7 @@ class OverlappingAxes : public PathTesting {
 TEST_F(OverlappingAxes, OfNestedElements) {
   const auto deep = parsed(repeated("<a>") + repeated("</a>"));
   for (const bool ordered : {true, false}) {
-    context->_internal().setOrdered(ordered);
+    _internal(*context).setOrdered(ordered);
     EXPECT_EQ(found(deep, {rootStep(), anyDepth(), child("a"), anyDepth(), child("a")}),
               count - 1U);
     EXPECT_EQ(foundFromEvery(deep, step(XQueryAxisDescendant, anyName())), count - 1U);
@@ -47,7 +47,7 @@ TEST_F(OverlappingAxes, OfNestedElements) {
 TEST_F(OverlappingAxes, OfSiblings) {
   const auto flat = parsed("<r>" + repeated("<a/>") + "</r>");
   for (const bool ordered : {true, false}) {
-    context->_internal().setOrdered(ordered);
+    _internal(*context).setOrdered(ordered);
     for (const int axis : {XQueryAxisFollowingSibling, XQueryAxisFollowing, XQueryAxisPreceding,
                            XQueryAxisPrecedingSibling}) {
       EXPECT_EQ(foundFromEvery(flat, step(axis, name("a"))), count - 1U) << axis;
@@ -100,7 +100,7 @@ TEST_F(OverlappingAxes, AreWalkedAgainForAPredicateThatReadsAVariableSetOnTheWay
   // True from the second "a" on only.
   int visits = 0;
   const auto setting = probe([&](XQueryContext& c) -> Value {
-    c._internal().setVariable(NSNumber::numberWithBool(++visits == 2), variable->varID());
+    _internal(c).setVariable(NSNumber::numberWithBool(++visits == 2), variable->varID());
     return NSNumber::trueValue();
   });
   EXPECT_EQ(found(nested, {rootStep(), anyDepth(), child("a", {setting}),

@@ -28,8 +28,8 @@ struct Profiled {
     items = context->evaluateXQuery(*query, {}, contextItem, &error);
   }
 
-  const XQueryProfiledProgram& program() const { return *query->_internal().profiledProgram(); }
-  const XQueryProfileCounts& counts() const { return context->_internal().profile()->counts(); }
+  const XQueryProfiledProgram& program() const { return *_internal(*query).profiledProgram(); }
+  const XQueryProfileCounts& counts() const { return _internal(*context).profile()->counts(); }
 
   static std::string nameOf(const XQueryProfiledExpression& expression) {
     const bool isBoth = !expression.role.empty() && !expression.label.empty();

@@ -95,13 +95,13 @@ TEST(ProfiledExpressions, OfFunctionsAndVariablesOfOtherModulesHaveTheirModule) 
   const auto context = XQueryContext::xqueryContext();
   ASSERT_EQ(context->evaluateXQuery(*query, {}, nullptr)->count(), 2u);
   std::vector<std::string> places;
-  for (const auto& each : query->_internal().profiledProgram()->expressions) {
+  for (const auto& each : _internal(*query).profiledProgram()->expressions) {
     if (each.depth > 0) continue;
     places.push_back(each.role + " " + each.place.module + ":" + std::to_string(each.place.line));
   }
   EXPECT_THAT(places, ElementsAre("variable $m:v http://e/m.xq:2", "function m:f#1 http://e/m.xq:4",
                                   "query :2"));
-  for (const auto& counter : context->_internal().profile()->counts().counters()) {
+  for (const auto& counter : _internal(*context).profile()->counts().counters()) {
     EXPECT_EQ(counter.calls, 1u);
   }
 }
@@ -114,7 +114,7 @@ TEST(ProfiledExpressions, KnowWhichTextTheyStandFor) {
       XQueryLoading(), XQueryLimits(), XQueryWay::Profiled);
   ASSERT_FALSE(query->parseErrors());
   std::vector<std::string> places;
-  for (const auto& each : query->_internal().profiledProgram()->expressions) {
+  for (const auto& each : _internal(*query).profiledProgram()->expressions) {
     places.push_back(each.label + " " + std::to_string(each.place.line) + ":" +
                      std::to_string(each.place.column) + "+" + std::to_string(each.place.length));
   }
@@ -150,15 +150,15 @@ TEST(ProfiledExpressions, OfAnotherQueryBeginAnew) {
   const auto second = compiled("count((1, 2, 3)), 1", XQueryWay::Profiled);
   ASSERT_TRUE(first.context->evaluateXQuery(*second, {}, nullptr));
   EXPECT_EQ(first.counts().evaluations(), 1u);
-  EXPECT_EQ(first.context->_internal().profile()->program(), second->_internal().profiledProgram());
+  EXPECT_EQ(_internal(*first.context).profile()->program(), _internal(*second).profiledProgram());
 }
 
 TEST(ProfiledExpressions, CostNothingWhereNobodyAsks) {
   const auto query = compiled("for $a in //a return count($a/b)", XQueryWay::Planned);
-  EXPECT_FALSE(query->_internal().profiledProgram());
+  EXPECT_FALSE(_internal(*query).profiledProgram());
   const auto context = XQueryContext::xqueryContext();
   ASSERT_TRUE(context->evaluateXQuery(*query, {}, documentOf(document)));
-  EXPECT_FALSE(context->_internal().profile());
+  EXPECT_FALSE(_internal(*context).profile());
 }
 
 // --- nothing else changes ------------------------------------------------------------------------

@@ -25,7 +25,7 @@ XQueryLimits limits(std::chrono::seconds duration) {
 }
 
 Value projected(const XQuery& query, std::string_view xml, uint32_t options, XMLWay way) {
-  const auto* plan = query._internal().projectionPlan();
+  const auto* plan = _internal(query).projectionPlan();
   TextSource source(xml);
   NSXMLParseError failure;
   const Ref<NSXMLDocument> document =
@@ -47,7 +47,7 @@ bool endedAtLimit(const Outcome& outcome) {
 // Whether the program needs less than all.
 bool agrees(const std::string& text, const std::string& xml, uint32_t options) {
   const auto query = compiled(text, XQueryWay::Planned);
-  const auto* plan = query->_internal().projectionPlan();
+  const auto* plan = _internal(*query).projectionPlan();
   if (!plan || !plan->isPossible()) return false;
   TextSource source(xml);
   NSXMLParseError failure;

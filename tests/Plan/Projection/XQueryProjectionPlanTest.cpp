@@ -2,6 +2,7 @@
 #include "Functions/XQueryBuiltInFunction.h"
 #include "Plan/PlanTesting.h"
 #include "Plan/Projection/XQueryProjectionPlan.h"
+#include "xquery/Exception.h"
 
 namespace xquery {
 namespace {

@@ -1,4 +1,5 @@
 #include "xquery/Error.h"
+#include "xquery/Exception.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,5 @@
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Numbers/NumberText.h"
 #include "Platform/Text/ICUText.h"
 #include "xquery/Collection.h"
 #include "xquery/Data.h"

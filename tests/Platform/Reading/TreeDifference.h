@@ -3,6 +3,7 @@
 #pragma once
 
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/TreeHead.h"
 #include "xquery/XMLNode.h"
 
 #include <string>
@@ -18,7 +19,7 @@ inline std::string differenceOfNodes(const NSXMLNode* one, const NSXMLNode* othe
   if (one->nodeName() != other->nodeName()) return place("the name");
   if (one->textView() != other->textView()) return place("the text");
   if (one->textView().isWide() != other->textView().isWide()) return place("the width");
-  if (one->orderNumber() != other->orderNumber()) return place("the number");
+  if (NSXMLNodeOrder::number(*one) != NSXMLNodeOrder::number(*other)) return place("the number");
   if (NSXMLTree::isCDATA(one) != NSXMLTree::isCDATA(other)) return place("the section");
   const auto* const element = dyn_cast<NSXMLElement>(one);
   if (!element) return "";

@@ -2,6 +2,7 @@
 #include "Platform/Reading/EndlessDocuments.h"
 #include "Platform/Reading/ReaderTestSupport.h"
 #include "Platform/Reading/XMLRecords.h"
+#include "Platform/Tree/Names.h"
 #include "Platform/Tree/XMLTestSupport.h"
 
 #include <gtest/gtest.h>

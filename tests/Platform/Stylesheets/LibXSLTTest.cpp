@@ -4,6 +4,7 @@
 #include "Platform/Reading/LibXMLMemory.h"
 #include "Platform/Stylesheets/LibXSLT.h"
 #include "Platform/Stylesheets/StylesheetTestSupport.h"
+#include "xquery/Exception.h"
 
 #include <algorithm>
 #include <chrono>

@@ -3,6 +3,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeHead.h"
 #include "Platform/Tree/XMLTestSupport.h"
 #include "xquery/XMLNode.h"
 
@@ -278,8 +279,8 @@ TEST(XMLTree, DetachMakesARoot) {
   EXPECT_EQ(c->previousSibling(), nullptr);
   EXPECT_EQ(names(a->firstChild(), &NSXMLNode::nextSibling), "b e ");
   EXPECT_EQ(names(a->lastChild(), &NSXMLNode::previousSibling), "e b ");
-  EXPECT_FALSE(NSXMLNode::haveComparableOrder(a, c.get()));
-  EXPECT_TRUE(NSXMLNode::haveComparableOrder(c.get(), c->firstChild()));
+  EXPECT_FALSE(NSXMLNodeOrder::areComparable(a, c.get()));
+  EXPECT_TRUE(NSXMLNodeOrder::areComparable(c.get(), c->firstChild()));
   EXPECT_EQ(NSXMLNode::compareOrder(c.get(), c->firstChild()), -1);
   const Ref<NSXMLNode> x = cast<NSXMLElement>(a->lastChild())->firstAttribute();
   x->detach();
@@ -352,8 +353,9 @@ void expectOrdered(const NSXMLNode* root) {
   std::vector<const NSXMLNode*> nodes;
   collect(root, nodes);
   for (size_t index = 1; index < nodes.size(); ++index) {
-    ASSERT_TRUE(NSXMLNode::haveComparableOrder(nodes[index - 1], nodes[index]));
-    ASSERT_LT(nodes[index - 1]->orderNumber(), nodes[index]->orderNumber()) << index;
+    ASSERT_TRUE(NSXMLNodeOrder::areComparable(nodes[index - 1], nodes[index]));
+    ASSERT_LT(NSXMLNodeOrder::number(*nodes[index - 1]), NSXMLNodeOrder::number(*nodes[index]))
+        << index;
     ASSERT_EQ(NSXMLNode::compareOrder(nodes[index - 1], nodes[index]), -1);
     ASSERT_EQ(NSXMLNode::compareOrder(nodes[index], nodes[index - 1]), 1);
   }
@@ -412,7 +414,7 @@ void mutate(uint32_t seed) {
     const NSXMLNode* checked = nodes[random() % nodes.size()]->rootNode();
     ASSERT_NO_FATAL_FAILURE(expectOrdered(checked)) << "seed " << seed << " step " << step;
     const NSXMLNode* other = nodes[random() % nodes.size()].get();
-    ASSERT_EQ(NSXMLNode::haveComparableOrder(checked, other), other->rootNode() == checked);
+    ASSERT_EQ(NSXMLNodeOrder::areComparable(checked, other), other->rootNode() == checked);
   }
   for (const auto& node : nodes) ASSERT_NO_FATAL_FAILURE(expectOrdered(node->rootNode()));
 }
@@ -485,8 +487,8 @@ TEST(XMLTree, TwoThreadsMayAskForTheOrderOfAStaleTree) {
     const auto ask = [&](bool& answer) {
       for (const NSXMLNode* node = parent->firstChild(); node->nextSibling();
            node = node->nextSibling()) {
-        answer = answer && NSXMLNode::haveComparableOrder(node, node->nextSibling()) &&
-                 node->orderNumber() < node->nextSibling()->orderNumber();
+        answer = answer && NSXMLNodeOrder::areComparable(node, node->nextSibling()) &&
+                 NSXMLNodeOrder::number(*node) < NSXMLNodeOrder::number(*node->nextSibling());
       }
     };
     std::thread one(ask, std::ref(ordered[0]));

@@ -1,6 +1,7 @@
 // Rows of nodes by their places are read as rows of pointers are.
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/NodeSpan.h"
+#include "Platform/Tree/TreeHead.h"
 #include "Platform/Tree/XMLTestSupport.h"
 
 #include <gtest/gtest.h>
@@ -49,9 +50,10 @@ TEST_F(NodeSpan, HasParts) {
 TEST_F(NodeSpan, CanBeSearched) {
   const NSXMLNodeSpan span = list.span();
   for (size_t i = 0; i < nodes.size(); ++i) {
-    const auto found = std::lower_bound(
-        span.begin(), span.end(), nodes[i]->orderNumber(),
-        [](const NSXMLNode* node, uint32_t number) { return node->orderNumber() < number; });
+    const auto found = std::lower_bound(span.begin(), span.end(), NSXMLNodeOrder::number(*nodes[i]),
+                                        [](const NSXMLNode* node, uint32_t number) {
+                                          return NSXMLNodeOrder::number(*node) < number;
+                                        });
     EXPECT_EQ(found - span.begin(), static_cast<ptrdiff_t>(i));
     EXPECT_EQ(span.begin()[static_cast<ptrdiff_t>(i)], nodes[i]);
   }

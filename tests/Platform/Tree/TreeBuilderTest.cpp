@@ -1,6 +1,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Names.h"
 #include "Platform/Tree/TreeBuilder.h"
+#include "Platform/Tree/TreeHead.h"
 #include "Platform/Tree/TreeIndexes.h"
 #include "Platform/Tree/XMLTestSupport.h"
 
@@ -63,7 +64,7 @@ TEST_F(Records, AreBuiltOneInThePlaceOfTheOther) {
       EXPECT_TRUE(written() == recordText(children, text)) << children << " " << length;
       EXPECT_EQ(record->parent()->firstChild(), record);
       EXPECT_EQ(record->parent()->lastChild(), record);
-      EXPECT_EQ(record->orderNumber(), start.nextNumber);
+      EXPECT_EQ(NSXMLNodeOrder::number(*record), start.nextNumber);
       EXPECT_EQ(document->lastChild()->lastChild(), record->parent());
       builder.backTo(start);
       builder.endOpenNodes();

@@ -3,6 +3,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeHead.h"
 #include "Platform/Tree/XMLTestSupport.h"
 #include "xquery/XMLNode.h"
 
@@ -229,7 +230,7 @@ class Forest {
 
   static void compareOrder(Model& a, Model& b) {
     const bool haveOneRoot = a.root() == b.root();
-    ASSERT_EQ(NSXMLNode::haveComparableOrder(a.node.get(), b.node.get()), haveOneRoot);
+    ASSERT_EQ(NSXMLNodeOrder::areComparable(a.node.get(), b.node.get()), haveOneRoot);
     if (!haveOneRoot) return;
     std::vector<const Model*> order;
     number(*a.root(), order);
