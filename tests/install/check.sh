@@ -38,6 +38,10 @@ case $way in
     gcc -std=c99 -Wall -Wextra -Wpedantic -Werror "$work/src/embed.c" -o "$work/embed_c" \
       $(pkg-config --cflags --libs xquery) -Wl,-rpath,"$(pkg-config --variable=libdir xquery)"
     actual_c=$("$work/embed_c" "$books")
+    # This one derives from the classes of the library, with run-time type information.
+    # shellcheck disable=SC2046
+    g++ -std=c++20 "$source_dir/examples/embedding.cpp" -o "$work/embedding" \
+      $(pkg-config --cflags --libs xquery)
     ;;
   command)
     actual=$("$work/prefix/bin/xquery" -e '//book[price > 10]/title/text()' "$books")
