@@ -61,7 +61,7 @@ def test_two_threads_do_twice_the_work_in_the_time_of_one() -> None:
             return
         if was_free and free_cores() > 1.8 and ratio > 1.6:
             break
-    if free_cores() < 1.8 and ratio < 2.6:
+    if free_cores() < 1.8:
         pytest.skip(f"there are not two free cores: {ratio:.2f}")
     assert ratio <= 1.2
 
