@@ -1,4 +1,4 @@
-// The README's program is the example that is compiled, and it does what the README says.
+// What the README shows works as it stands, and so does the smallest example for hosts.
 #include "cli/Command.h"
 
 #include <gtest/gtest.h>
@@ -48,19 +48,19 @@ TEST(Readme, TheExampleInCReportsADocumentThatIsNotThere) {
   EXPECT_EQ(outcome.err, "/nowhere.xml: No such file or directory\n");
 }
 
-TEST(Readme, TheExamplePrintsTheTitles) {
+TEST(SmallestExample, PrintsTheTitles) {
   const Outcome outcome = command::start("xquery_embed", {books()});
   EXPECT_EQ(outcome.status, 0);
   EXPECT_EQ(outcome.out, "A Field Guide to Lichens\nBrücken & Wege\n");
 }
 
-TEST(Readme, TheExampleReportsADocumentThatIsNotThere) {
+TEST(SmallestExample, ReportsADocumentThatIsNotThere) {
   const Outcome outcome = command::start("xquery_embed", {"/nowhere.xml"});
   EXPECT_EQ(outcome.status, 3);
   EXPECT_NE(outcome.err.find("/nowhere.xml: "), std::string::npos);
 }
 
-TEST(Readme, TheExamplePrintsNothingForAnEmptyQuery) {
+TEST(SmallestExample, PrintsNothingForAnEmptyQuery) {
   for (const char* query : {"", "()", "(: nothing :)", "module namespace m = 'urn:m';"}) {
     const Outcome outcome = command::start("xquery_embed", {books(), query});
     EXPECT_EQ(outcome.status, 0) << query;
@@ -68,7 +68,7 @@ TEST(Readme, TheExamplePrintsNothingForAnEmptyQuery) {
   }
 }
 
-TEST(Readme, TheExampleReportsAnErrorWhereverItStands) {
+TEST(SmallestExample, ReportsAnErrorWhereverItStands) {
   for (const char* query : {"//book[", "1 idiv 0", "<!-- a -- b -->", "(1, <!-- a -- b -->, 2)"}) {
     const Outcome outcome = command::start("xquery_embed", {books(), query});
     EXPECT_EQ(outcome.status, 1) << query;
