@@ -569,10 +569,11 @@ bool Conversion::waitFor(pthread_t thread) {
   }
 }
 
-// Throws when it was the ceiling of this thread's values that was reached, and not our own.
+// Throws when it was the ceiling of this thread's values that was reached, and not our own. What
+// was refused may be so little that counting it alone would not be noticed.
 void Conversion::refuse() {
-  countValueBlock(_allocator.refusedBytes());
-  uncountValueBytes(_allocator.refusedBytes());
+  const CountedBytes counted(_allocator.refusedBytes());
+  lookAtWork();
 }
 
 bool Conversion::leave(pthread_t thread) {
