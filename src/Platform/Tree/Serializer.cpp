@@ -142,14 +142,21 @@ bool contradicts(const Declaration& declaration, const Declaration& needed) {
   return declaration.prefix.equals(needed.prefix) && !declaration.URI.equals(needed.URI);
 }
 
+// As a name without a namespace is written without its prefix.
+bool spellsDefault(const NSXMLNode* attribute) {
+  if (attribute->nameView() == "xmlns") return true;
+  return attribute->URIView().isEmpty() && attribute->localNameView() == "xmlns" &&
+         !isReserved(attribute->prefixView());
+}
+
 bool spellsDeclaration(const NSXMLNode* attribute) {
   const NSStringView URI = attribute->URIView();
   if (URI == namespaceOfDeclarations) return true;
-  return URI.isEmpty() && (attribute->nameView() == "xmlns" || attribute->prefixView() == "xmlns");
+  return URI.isEmpty() && (spellsDefault(attribute) || attribute->prefixView() == "xmlns");
 }
 
 Declaration declarationSpeltBy(const NSXMLNode* attribute) {
-  const bool isDefault = attribute->nameView() == "xmlns";
+  const bool isDefault = spellsDefault(attribute);
   return {isDefault ? NSStringView() : attribute->localNameView(), attribute->textView()};
 }
 

@@ -222,6 +222,17 @@ TEST(XMLSerializer, AttributesThatSpellDeclarationsAreSuch) {
             "<p:a xmlns:p=\"urn:p\" xmlns:q=\"urn:q\" xmlns=\"urn:q\" xmlns:r=\"urn:r\"/>");
 }
 
+// Without a namespace a name is written without its prefix.
+TEST(XMLSerializer, AttributesThatWouldBeWrittenAsADeclarationAreOne) {
+  const auto prefixed = NSXMLElement::elementWithName(A("p:a"), A("urn:p"));
+  prefixed->addAttribute(NSXMLNode::attributeWithName(A("q:xmlns"), A("urn:1")));
+  prefixed->addAttribute(NSXMLNode::attributeWithName(A("xmlns"), A("urn:2")));
+  EXPECT_EQ(written(prefixed.get()), "<p:a xmlns:p=\"urn:p\" xmlns=\"urn:1\"/>");
+  const auto plain = NSXMLElement::elementWithName(A("a"));
+  plain->addAttribute(NSXMLNode::attributeWithName(A("q:xmlns"), A("urn:1")));
+  EXPECT_EQ(written(plain.get()), "<a/>");
+}
+
 TEST(XMLSerializer, OfAttributesThatReadAlikeTheFirstIsWritten) {
   const auto element = NSXMLElement::elementWithName(A("a"));
   element->addAttribute(NSXMLNode::attributeWithName(A("p:x"), A("1"), A("urn:x")));
