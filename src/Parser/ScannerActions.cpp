@@ -32,7 +32,6 @@ bool isReservedTarget(std::string_view name) {
 
 // A name in an expression: a wildcard, the start of a function call or a name test.
 XQueryScannedWord scanOperand(std::string_view rest) {
-  XQueryScannedWord word;
   const size_t prefix = XQueryNCNameLength(rest);
   if (prefix > 0 && rest.substr(prefix, 2) == ":*") {
     return {.length = prefix + 2,
