@@ -2,6 +2,7 @@
 #include "xquery/capi/basics.h"
 
 #include "C/Handles.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Error.h"
 #include "xquery/Memory.h"
 

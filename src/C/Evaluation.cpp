@@ -5,6 +5,7 @@
 #include "C/Queries.h"
 #include "C/Texts.h"
 #include "C/Values.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Collection.h"
 #include "xquery/Stream.h"
 
