@@ -139,9 +139,10 @@ def test_the_interpreter_ends_with_a_stream_under_way(
 ) -> None:
     done = run_python(
         "import xquery\n"
-        f"stream = xquery.compile('for $r in /a/r return string($r)').stream({str(long_file)!r})\n"
+        "query = xquery.compile('for $r in /a/r return string($r)')\n"
+        f"stream = query.stream({str(long_file)!r})\n"
         "print(next(stream))\n"
-        f"other = xquery.compile('for $r in /a/r return string($r)').stream(open({str(long_file)!r}, 'rb'))\n"
+        f"other = query.stream(open({str(long_file)!r}, 'rb'))\n"
         "print(next(other))\n"
     )
     assert (done.returncode, done.stdout) == (0, "text 0\ntext 0\n"), done.stderr  # type: ignore[attr-defined]

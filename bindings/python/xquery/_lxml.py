@@ -25,7 +25,7 @@ def from_lxml(tree: Any) -> Node:
         raise TypeError(f"{type(tree).__name__} is no tree of lxml")
     if isinstance(tree, (etree._Comment, etree._ProcessingInstruction)):
         wrapped = b"<a>" + etree.tostring(tree, encoding="UTF-8", with_tail=False) + b"</a>"
-        return _xquery.parse_bytes(wrapped, "lxml", False, False, None).children[0].children[0].copy()
+        return _xquery.parse_bytes(wrapped, "lxml", False, False, None)[0][0].copy()
     # Without the document type, whose declarations say nothing that is not in the tree already.
     text = etree.tostring(tree, encoding="UTF-8", with_tail=False, doctype="" if whole else None)
     document = _xquery.parse_bytes(text, "lxml", False, False, None)

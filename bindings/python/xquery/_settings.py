@@ -68,7 +68,8 @@ class Policy:
         return self._with("forbid_local_addresses")
 
     def __repr__(self) -> str:
-        calls = [f".{name}({argument!r})" if argument else f".{name}()" for name, argument in self.rules]
+        rules = self.rules
+        calls = [f".{name}({argument!r})" if argument else f".{name}()" for name, argument in rules]
         return "Policy" + ("" if calls and calls[0] == ".deny()" else "()") + "".join(calls)
 
 
@@ -153,5 +154,4 @@ def _working_folder() -> str:
 
 
 def _found_in(modules: Mapping[str, str], base: str) -> Callable[[str], Optional[str]]:
-    texts = {_xquery.resolve(location, base) or location: text for location, text in modules.items()}
-    return texts.get
+    return {_xquery.resolve(name, base) or name: text for name, text in modules.items()}.get

@@ -276,7 +276,8 @@ class Duration:
     def __str__(self) -> str:
         fields = ((self.years, "Y"), (self.months, "M"), (self.days, "D"))
         day = "".join(f"{value}{letter}" for value, letter in fields if value)
-        clock = "".join(f"{v}{letter}" for v, letter in ((self.hours, "H"), (self.minutes, "M")) if v)
+        fields = ((self.hours, "H"), (self.minutes, "M"), (0, ""))
+        clock = "".join(f"{value}{letter}" for value, letter in fields if value)
         if self.seconds or not (day or clock):
             seconds = f"{self.seconds:.9f}".rstrip("0").rstrip(".")
             clock += f"{seconds}S"
