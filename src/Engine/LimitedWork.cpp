@@ -2,6 +2,7 @@
 
 #include "Context/LimitWatch.h"
 #include "Types/XQueryErrors.h"
+#include "xquery/Exception.h"
 
 #include <new>
 
