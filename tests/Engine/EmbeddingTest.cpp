@@ -1,4 +1,6 @@
-// The public interface as a host program uses it: nothing but the installed headers.
+// The public interface as a host program uses it: the installed headers, and of the engine only how
+// it hands a trace on.
+#include "Context/XQueryContextInternal.h"
 #include "Engine/EmbeddingTesting.h"
 
 #include <atomic>
