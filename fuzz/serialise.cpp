@@ -245,16 +245,15 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   std::string written;
   root->appendXMLTo(written);
   const auto document = readBack(written);
-  std::string again;
-  document->rootElement()->appendXMLTo(again);
   if (!isSane) {
     // What spelt a declaration is one by now.
+    std::string again;
+    document->rootElement()->appendXMLTo(again);
     std::string third;
     readBack(again)->rootElement()->appendXMLTo(third);
     checkEqual(third, again, "written otherwise once it is read");
     return 0;
   }
-  checkEqual(again, written, "written otherwise once it is read");
   checkIndented(*root);
   checkEqual(described(document->rootElement()), described(root.get()),
              "read back as another tree");
