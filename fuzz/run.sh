@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# run.sh MINUTES [TARGET...]: builds all fuzz targets into build/fuzz and runs one after another,
-# those named or all, each for so many minutes (fractions are allowed). XQUERY_FUZZ_JOBS says how many
+# run.sh MINUTES [TARGET...]: builds fuzz targets into build/fuzz and runs one after another, those
+# named or all, each for so many minutes (fractions are allowed). XQUERY_FUZZ_JOBS says how many
 # of them run at a time, one unless given. What makes one fail is kept under
 # build/fuzz/found/TARGET, what it has learnt under build/fuzz/corpus/TARGET for the next run;
 # XQUERY_FUZZ_CORPUS names another folder for that. The status is 1 when something was found: mend it,
@@ -16,6 +16,7 @@ cd "$top/fuzz" || exit 1
 targets=("$@")
 [ ${#targets[@]} -gt 0 ] || targets=(*.cpp)
 targets=("${targets[@]%.cpp}")
+(build fuzz -DXQUERY_WERROR="${XQUERY_WERROR:-OFF}" -- "${targets[@]/#/fuzz_}") || exit 1
 seconds=$(awk -v minutes="$minutes" 'BEGIN { all = int(minutes * 60); print (all > 1 ? all : 1) }')
 out=$top/build/fuzz
 results=$(mktemp -d)
