@@ -5,7 +5,8 @@
 
 #include <stdexcept>
 #include <string>
-#include <thread>
+#include <sys/mman.h>
+#include <unistd.h>
 
 namespace xquery {
 namespace {
@@ -46,14 +47,32 @@ TEST(LimitedWork, EndsReadingAtEachLimit) {
   EXPECT_EQ(readWithin(memory), "0 limit: memory ceiling reached");
   EXPECT_FALSE(document);
   XQueryLimits flag;
-  flag.cancelled = std::make_shared<std::atomic<bool>>(false);
-  std::thread other([&] {
-    std::this_thread::sleep_for(Milliseconds(3));
-    flag.cancelled->store(true);
-  });
-  EXPECT_EQ(readWithin(flag), "0 limit: evaluation cancelled");
-  other.join();
+  flag.cancelled = std::make_shared<std::atomic<bool>>(true);
   EXPECT_EQ(readWithin(flag), "0 limit: evaluation cancelled") << "at once";
+}
+
+// The flag is raised once a first piece has been read.
+TEST(LimitedWork, EndsReadingAFileWhenItIsCancelled) {
+  const std::string text = longDocument();
+  const int file = ::memfd_create("document", MFD_CLOEXEC);
+  ASSERT_GE(file, 0);
+  ASSERT_EQ(::write(file, text.data(), text.size()), static_cast<ssize_t>(text.size()));
+  ASSERT_EQ(::lseek(file, 0, SEEK_SET), 0);
+  XQueryLimits limits;
+  limits.cancelled = std::make_shared<std::atomic<bool>>(false);
+  uint64_t bytesRead = 0;
+  const auto progress = [&](uint64_t bytes, uint64_t) {
+    bytesRead = bytes;
+    limits.cancelled->store(true);
+  };
+  const auto error = XQueryWithinLimits(limits, [&] {
+    static_cast<void>(NSXMLDocument::documentWithFile("/proc/self/fd/" + std::to_string(file),
+                                                      NSXMLNodeOptionsNone, nullptr, progress));
+  });
+  ::close(file);
+  EXPECT_EQ(messageOf(error), "0 limit: evaluation cancelled");
+  EXPECT_GT(bytesRead, 0u);
+  EXPECT_LT(bytesRead, text.size());
 }
 
 TEST(LimitedWork, PassesOnWhatTheWorkThrows) {

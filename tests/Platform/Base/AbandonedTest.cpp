@@ -65,7 +65,7 @@ TEST_F(Abandoned, LongListsAreFreedByAnotherThreadAndCountedUntilThen) {
 }
 
 // A child has no thread but the one that forked, and may abandon values of its own.
-TEST_F(Abandoned, AForkWaitsForTheThread) {
+TEST_F(Abandoned, AForkWaitsForWhatIsBeingFreed) {
   const size_t many = AbandonedValues::manyPartsInAll;
   abandon(witnesses(many));
   const pid_t child = ::fork();
