@@ -569,9 +569,11 @@ bool Conversion::waitFor(pthread_t thread) {
   }
 }
 
-// Throws when it was the ceiling of this thread's values that was reached, and not our own. What
-// was refused may be so little that counting it alone would not be noticed.
+// Throws when it was the ceiling of this thread's values that was reached, and not our own. A large
+// block is refused as it is counted; a small one goes unnoticed until somebody looks.
 void Conversion::refuse() {
+  countValueBlock(_allocator.refusedBytes());
+  uncountValueBytes(_allocator.refusedBytes());
   const CountedBytes counted(_allocator.refusedBytes());
   lookAtWork();
 }
