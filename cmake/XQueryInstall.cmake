@@ -24,13 +24,13 @@ if(TARGET xquery-command)
           COMPONENT command)
 endif()
 
+# As they lie here, so that the documents' links lead somewhere.
 install(FILES "${PROJECT_SOURCE_DIR}/LICENSE" DESTINATION "${CMAKE_INSTALL_DOCDIR}"
         COMPONENT license)
-install(DIRECTORY "${PROJECT_SOURCE_DIR}/docs/" DESTINATION "${CMAKE_INSTALL_DOCDIR}"
-        COMPONENT command FILES_MATCHING PATTERN "*.md")
-install(DIRECTORY "${PROJECT_SOURCE_DIR}/examples" DESTINATION "${CMAKE_INSTALL_DOCDIR}"
-        COMPONENT command PATTERN CMakeLists.txt EXCLUDE PATTERN "*.c" EXCLUDE
-        PATTERN "*.cpp" EXCLUDE)
+install(FILES "${PROJECT_SOURCE_DIR}/README.md" "${PROJECT_SOURCE_DIR}/CONTRIBUTING.md"
+        DESTINATION "${CMAKE_INSTALL_DOCDIR}" COMPONENT command)
+install(DIRECTORY "${PROJECT_SOURCE_DIR}/docs" "${PROJECT_SOURCE_DIR}/examples"
+        DESTINATION "${CMAKE_INSTALL_DOCDIR}" COMPONENT command PATTERN CMakeLists.txt EXCLUDE)
 install(DIRECTORY "${PROJECT_SOURCE_DIR}/examples"
         DESTINATION "${CMAKE_INSTALL_DATADIR}/doc/libxquery-dev" COMPONENT development
         FILES_MATCHING PATTERN "*.c" PATTERN "*.cpp" PATTERN modules EXCLUDE)

@@ -46,11 +46,22 @@ case $way in
   command)
     actual=$("$work/prefix/bin/xquery" -e '//book[price > 10]/title/text()' "$books")
     expected=$'A Field Guide to Lichens\nBrücken &amp; Wege'
-    # Documents, licence and examples, and nothing that only the project's own folder has.
-    documents=$(find "$work/prefix/share/doc" -name guide.md -printf '%h')
-    for file in "$source_dir"/docs/*.md "$source_dir/LICENSE"; do
-      cmp -s "$file" "$documents/${file##*/}" || { echo "$file is not installed" >&2; exit 1; }
+    # Documents, licence and examples; whatever a document leads to is there as well.
+    documents=$(dirname "$(find "$work/prefix/share/doc" -name guide.md -printf '%h')")
+    for file in docs/{command,dialect,embedding,errors,functions,guide}.md LICENSE README.md; do
+      cmp -s "$source_dir/$file" "$documents/$file" ||
+        { echo "$file is not installed" >&2; exit 1; }
     done
+    links=0
+    for page in "$documents"/*.md "$documents"/docs/*.md; do
+      # What stands between fences is no link.
+      while read -r link; do
+        [ -e "$(dirname "$page")/$link" ] || { echo "$page: $link is missing" >&2; exit 1; }
+        links=$((links + 1))
+      done < <(sed '/^```/,/^```/d' "$page" | grep -oE '\]\([^)#]+' | sed 's/^](//' |
+        grep -v '^https\?:')
+    done
+    [ "$links" -gt 20 ]
     [ "$(cd "$documents/examples" && "$work/prefix/bin/xquery" --var limit=30 affordable.xq books.xml)" = \
       "$(cd "$source_dir/examples" && "$work/prefix/bin/xquery" --var limit=30 affordable.xq books.xml)" ]
     # The manual page and the completions know every option that the help knows.
