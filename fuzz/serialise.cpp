@@ -19,6 +19,7 @@ namespace {
 constexpr uint32_t keepsAll = NSXMLNodePreserveWhitespace | NSXMLNodePreserveCDATA;
 constexpr size_t mostEvents = 400;
 constexpr size_t longestText = 24;
+constexpr size_t mostCopied = 10'000;  // nodes
 
 Ref<NSString> string(std::string_view text) {
   return NSString::stringWithUTF8Replacing(text);
@@ -200,13 +201,26 @@ class Builder {
         move();
         break;
       default:
-        add(any()->copy());
+        copy();
     }
+  }
+
+  // Copies of copies grow without bound.
+  void copy() {
+    const NSXMLElement* original = any();
+    size_t nodes = 1;
+    for (const NSXMLNode* node = original->nextNode(); node && node->level() > original->level();
+         node = node->nextNode()) {
+      ++nodes;
+    }
+    _copied += nodes;
+    if (_copied <= mostCopied) add(original->copy());
   }
 
   Input& _input;
   const bool _isSane;
   std::vector<Ref<NSXMLElement>> _elements;
+  size_t _copied = 0;
 };
 
 // --- checks --------------------------------------------------------------------------------------
