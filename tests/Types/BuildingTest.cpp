@@ -267,6 +267,36 @@ TEST(FrozenDocument, ItsCopiesCanBeChanged) {
   EXPECT_EQ(after(XQueryRemove(*whole->firstChild())), "done");
 }
 
+// What a copy of nodes that were in a frozen document is joined with stays as it was.
+TEST(FrozenDocument, DoesNotFreezeWhatItsCopiesArePutInto) {
+  const Ref<NSXMLDocument> document = XQueryFreeze(parse("<a/>"));
+  const auto parent = element("p");
+  ASSERT_EQ(after(XQueryAddChild(*parent, document->rootElement()->copy())), "done");
+  EXPECT_FALSE(XQueryIsFrozen(*parent));
+  EXPECT_EQ(after(XQueryAddChild(*parent, Ref<NSXMLNode>(document->rootElement()))),
+            "0 the node has a parent already");
+  EXPECT_EQ(after(XQueryAddChild(*parent, document)), misplaced);
+  EXPECT_TRUE(XQueryIsFrozen(*document));
+  EXPECT_EQ(after(XQueryAddChild(*parent, text())), "done");
+}
+
+TEST(FrozenDocument, RefusesNewDeclarationsAndNewURIsOfThoseItHas) {
+  const Ref<NSXMLDocument> document = parse("<a xmlns:p=\"urn:p\"><?i c?><!--c--></a>");
+  document->setURI(testing::text("urn:d"));
+  ASSERT_EQ(XQueryFreeze(document), document);
+  NSXMLElement& root = *document->rootElement();
+  NSXMLNode& declaration = *root.firstNamespace();
+  document->setURI(nullptr);
+  declaration.setStringValue(view("urn:q"));
+  declaration.detach();
+  root.firstChild()->setStringValue(view("d"));
+  root.lastChild()->setStringValue(view("d"));
+  EXPECT_EQ(after(XQuerySetText(declaration, "urn:q")), frozen);
+  EXPECT_EQ(after(XQueryRemove(declaration)), frozen);
+  EXPECT_EQ(document->documentURI()->utf8(), "urn:d");
+  EXPECT_EQ(root.XMLString()->utf8(), "<a xmlns:p=\"urn:p\"><?i c?><!--c--></a>");
+}
+
 TEST(FrozenDocument, OfWhichNodesWereTakenOutIsACopy) {
   const Ref<NSXMLDocument> document = parse("<a><b/><c/></a>");
   const Ref<NSXMLNode> taken = document->rootElement()->firstChild();
@@ -311,6 +341,7 @@ TEST(FrozenDocumentConcurrency, IsReadByThreads) {
       const auto found = XQueryContext::xqueryContext()->evaluateXQuery(*count, {}, shared);
       if (found) answer = XQueryItemStringValue(*found->objectAtIndex(0));
       shared->rootElement()->detach();  // refused, and so no harm to the others
+      if (XQueryFreeze(shared) != shared) answer = "copied";
     });
   }
   for (std::thread& thread : threads) thread.join();

@@ -436,7 +436,6 @@ void NSXMLTree::absorb(NSXMLTree* smaller) {
   smaller->_lastBlock->next = first;
   setBlockCount(uint64_t{blockCount()} + smaller->blockCount());
   _era = std::min(_era, smaller->_era);
-  _hasFrozen |= smaller->_hasFrozen;
   const uint64_t sum = uint64_t{references} + smaller->references;
   references = sum >= immortalBit ? immortalBit : static_cast<uint32_t>(sum);
   NSCounted::operator delete(smaller, sizeof(NSXMLTree));
@@ -508,15 +507,11 @@ void NSXMLTree::noteTakenIn(const NSXMLNode* parent, const NSXMLNode* node) {
 
 bool NSXMLTree::freeze(NSXMLDocument* document) {
   NSXMLTree* const tree = of(document);
+  if (tree->_isFrozen) return true;  // and perhaps read by others, so that nothing is written
   if (tree->hasSeveralRoots()) return false;
-  document->_flags |= frozen;
-  tree->_hasFrozen = true;
+  tree->_isFrozen = true;
   tree->becomeOld();
   return true;
-}
-
-bool NSXMLTree::hasFrozenRoot(const NSXMLNode* node) {
-  return (node->rootNode()->_flags & frozen) != 0;
 }
 
 bool NSXMLTree::isRootAbove(const NSXMLNode* node, const NSXMLNode* root) {

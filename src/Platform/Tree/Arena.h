@@ -235,14 +235,12 @@ class NSXMLTree : public NSXMLTreeHead {
   static void setFixed(NSXMLNode* node) { node->_flags |= NSXMLNode::Fixed; }
   static bool isFixed(const NSXMLNode* node) { return (node->_flags & NSXMLNode::Fixed) != 0; }
 
-  // A frozen document, and all that is in it, is never changed; other roots of the tree may be.
-  // Answer: whether the document is the only root of its tree, without which it is not frozen, as
-  // a change of another root might move its memory to another tree.
+  // A frozen document, and all that is in it, is never changed. Answer: whether the document is the
+  // only root of its tree, without which it is not frozen, as a change of another root might move
+  // its memory to another tree. No other root comes to a frozen tree: nothing is taken out of it,
+  // and it is joined with no other one.
   static bool freeze(NSXMLDocument* document);
-  // Of the node's root.
-  static bool isFrozen(const NSXMLNode* node) {
-    return of(node)->_hasFrozen && hasFrozenRoot(node);
-  }
+  static bool isFrozen(const NSXMLNode* node) { return of(node)->_isFrozen; }
 
   // The number of a root whose subtree's numbers are good, as they are assigned; and of a root
   // whose subtree's numbers are not good, where the tree has several roots.
@@ -318,11 +316,9 @@ class NSXMLTree : public NSXMLTreeHead {
   static void unlink(NSXMLNode* node);
   static void renumber(const NSXMLNode* root);
 
-  // Bits of a node's flags beside those of NSXMLNode::Flag, which others may look at: the first is
+  // A bit of a node's flags beside those of NSXMLNode::Flag, which others may look at: this one is
   // only ever set while nobody but the thread that makes the node knows it.
   static constexpr uint8_t unfinished = 1U << 7;
-  static constexpr uint8_t frozen = 1U << 6;  // of a document
-  static bool hasFrozenRoot(const NSXMLNode* node);
 
   uint8_t blockCountHigh = 0;  // saturates; only compared
   uint16_t blockCountLow = 0;
@@ -336,7 +332,7 @@ class NSXMLTree : public NSXMLTreeHead {
   std::atomic<NSXMLTreeIndexes*> _indexes = nullptr;  // made when they pay, see TreeIndexes.h
   uint64_t _era : 62 =
       NSXMLEra::current();                // in which it was made; of merged trees the older one's
-  uint64_t _hasFrozen : 1 = false;        // perhaps: a frozen document is a root of it
+  uint64_t _isFrozen : 1 = false;         // its only root is a frozen document
   uint64_t _baseURIsAreAlike : 1 = true;  // of one owner, with one URI
 };
 
