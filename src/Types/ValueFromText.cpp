@@ -1,5 +1,7 @@
 // Values from their lexical forms, as XML Schema Part 2 has them. The casts of the language are
-// more lenient about numbers and less about white space; what both take gives the same value.
+// another matter: they are more lenient about numbers and less about white space, give xs:int 64
+// bits, and lose the zeros that begin the fraction of a duration's seconds.
+#include "Platform/Dates/GregorianCalendar.h"
 #include "Platform/Numbers/NumberText.h"
 #include "Platform/Reading/XMLCharacters.h"
 #include "Types/LexicalForms.h"
@@ -12,6 +14,7 @@
 #include "Types/XQueryValueText.h"
 
 #include <charconv>
+#include <iterator>
 #include <limits>
 
 namespace xquery {
@@ -35,41 +38,16 @@ Result outOfRange(Type type, std::string_view text) {
 // What the facet whiteSpace of the type makes of a text: normalizedString replaces each by a blank,
 // what derives from it has one blank between words and none around them.
 std::string withWhiteSpaceOf(Type type, std::string_view text) {
+  const bool collapses = type != Type::NormalizedString;
   std::string made;
   made.reserve(text.size());
   for (const char byte : text) {
     const bool isSpace = isXMLSpace(byte);
-    const bool collapses = type != Type::NormalizedString;
     if (isSpace && collapses && (made.empty() || made.back() == ' ')) continue;
     made += isSpace ? ' ' : byte;
   }
-  if (type != Type::NormalizedString && !made.empty() && made.back() == ' ') made.pop_back();
+  if (collapses && !made.empty() && made.back() == ' ') made.pop_back();
   return made;
-}
-
-Ref<XQueryString> derivedString(Type type, const NSString& text) {
-  switch (type) {
-    case Type::NormalizedString:
-      return XQueryString::normalizedStringWithString(text);
-    case Type::Token:
-      return XQueryString::tokenWithString(text);
-    case Type::Language:
-      return XQueryString::languageWithString(text);
-    case Type::Name:
-      return XQueryString::nameWithString(text);
-    case Type::NCName:
-      return XQueryString::ncNameWithString(text);
-    case Type::ID:
-      return XQueryString::idWithString(text);
-    case Type::IDREF:
-      return XQueryString::idRefWithString(text);
-    case Type::ENTITY:
-      return XQueryString::entityWithString(text);
-    case Type::NMTOKEN:
-      return XQueryString::nmTokenWithString(text);
-    default:
-      return nullptr;
-  }
 }
 
 Result fromString(Type type, std::string_view text) {
@@ -78,43 +56,44 @@ Result fromString(Type type, std::string_view text) {
   if (auto error = XQueryTextError(text)) return error;
   const std::string made = withWhiteSpaceOf(type, text);
   if (type == Type::Language && !XQueryIsLanguageForm(made)) return malformed(type, text);
-  if (auto string = derivedString(type, *NSString::stringWithUTF8(made))) return string;
+  const auto typeID = static_cast<XQueryTypeID>(type);
+  if (auto string = XQueryString::stringOfType(typeID, *NSString::stringWithUTF8(made))) {
+    return string;
+  }
   return malformed(type, text);
 }
 
 // --- numbers -------------------------------------------------------------------------------------
 
 struct IntegerRange {
-  Type type;
   std::optional<int64_t> lowest;
   std::optional<uint64_t> highest;  // no type ends below 0 but those that end at it and at -1
 };
 
 template <class Number>
-constexpr IntegerRange rangeOf(Type type) {
-  return {type, std::numeric_limits<Number>::min(),
-          static_cast<uint64_t>(std::numeric_limits<Number>::max())};
-}
+constexpr IntegerRange rangeOf = {std::numeric_limits<Number>::min(),
+                                  static_cast<uint64_t>(std::numeric_limits<Number>::max())};
 
+// By type, from integer on.
 constexpr IntegerRange integerRanges[] = {
-    {Type::Integer, std::nullopt, std::nullopt},
-    {Type::NonNegativeInteger, 0, std::nullopt},
-    {Type::PositiveInteger, 1, std::nullopt},
-    {Type::NonPositiveInteger, std::nullopt, 0},
-    {Type::NegativeInteger, std::nullopt, 0},
-    rangeOf<int64_t>(Type::Long),
-    rangeOf<int32_t>(Type::Int),
-    rangeOf<int16_t>(Type::Short),
-    rangeOf<int8_t>(Type::Byte),
-    rangeOf<uint64_t>(Type::UnsignedLong),
-    rangeOf<uint32_t>(Type::UnsignedInt),
-    rangeOf<uint16_t>(Type::UnsignedShort),
-    rangeOf<uint8_t>(Type::UnsignedByte),
+    {std::nullopt, std::nullopt},  // integer
+    {0, std::nullopt},             // nonNegativeInteger
+    {1, std::nullopt},             // positiveInteger
+    {std::nullopt, 0},             // nonPositiveInteger
+    {std::nullopt, 0},             // negativeInteger
+    rangeOf<int64_t>,              // long
+    rangeOf<int32_t>,              // int
+    rangeOf<int16_t>,              // short
+    rangeOf<int8_t>,               // byte
+    rangeOf<uint64_t>,             // unsignedLong
+    rangeOf<uint32_t>,             // unsignedInt
+    rangeOf<uint16_t>,             // unsignedShort
+    rangeOf<uint8_t>,              // unsignedByte
 };
+static_assert(std::size(integerRanges) == XQueryTypeUnsignedByte - XQueryTypeInteger + 1);
 
 bool isInRange(Type type, const NSDecimal& value) {
-  const size_t row = static_cast<size_t>(type) - static_cast<size_t>(Type::Integer);
-  const IntegerRange& range = integerRanges[row];
+  const IntegerRange& range = integerRanges[static_cast<XQueryTypeID>(type) - XQueryTypeInteger];
   if (range.lowest && value.compare(NSDecimal(*range.lowest)) < 0) return false;
   if (range.highest && value.compare(NSDecimal::fromUnsigned(*range.highest)) > 0) return false;
   return type != Type::NegativeInteger || !value.isZero();
@@ -169,21 +148,6 @@ Result fromBoolean(std::string_view text) {
 
 // --- dates and durations -------------------------------------------------------------------------
 
-// 24 o'clock is the next day's 0 o'clock; a time of day has no other day.
-void endOfDay(Type type, XQueryDateTimeParts& parts) {
-  using namespace std::chrono;
-  parts.hour = 0;
-  if (type != Type::DateTime) return;
-  static constexpr int lastDays[] = {31, 28, 31, 30, 31, 30, 31, 31, 30, 31, 30, 31};
-  const bool isLeap = parts.year % 4 == 0 && (parts.year % 100 != 0 || parts.year % 400 == 0);
-  const int lastDay = lastDays[parts.month - 1] + (parts.month == 2 && isLeap ? 1 : 0);
-  if (++parts.day <= lastDay) return;
-  parts.day = 1;
-  if (++parts.month <= 12) return;
-  parts.month = 1;
-  ++parts.year;
-}
-
 Result fromDate(Type type, std::string_view text) {
   XQueryDateTimeParts parts;
   switch (XQueryReadDateForm(type, text, parts)) {
@@ -197,14 +161,15 @@ Result fromDate(Type type, std::string_view text) {
   const bool isEndOfDay =
       parts.hour == 24 && parts.minute == 0 && parts.second == 0 && parts.nanosecond == 0;
   if (!isEndOfDay) return XQueryMakeDateOfType(type, parts);
-  XQueryDateTimeParts morning = parts;
-  morning.hour = 0;
-  Result made = XQueryMakeDateOfType(type, morning);
-  if (!made) return made;
-  const bool isLastDay = type == Type::DateTime && parts.month == 12 && parts.day == 31 &&
-                         parts.year == std::numeric_limits<int32_t>::max();
-  if (isLastDay) return outOfRange(type, text);
-  endOfDay(type, parts);
+  // 24 o'clock is 0 o'clock of the next day; a time of day has no other day.
+  parts.hour = 0;
+  Result made = XQueryMakeDateOfType(type, parts);
+  if (!made || type == Type::Time) return made;
+  const CalendarDay next = calendarDay(dayNumber(parts.year, parts.month, parts.day) + 1);
+  if (next.year > std::numeric_limits<int32_t>::max()) return outOfRange(type, text);
+  parts.year = static_cast<int32_t>(next.year);
+  parts.month = next.month;
+  parts.day = next.day;
   return XQueryMakeDateOfType(type, parts);
 }
 

@@ -13,10 +13,8 @@
 #include "xquery/URL.h"
 #include "xquery/Values.h"
 
-#include <array>
 #include <cmath>
 #include <cstdio>
-#include <limits>
 
 namespace xquery {
 
@@ -92,6 +90,7 @@ Value XQueryMakeDouble(double value) {
   return XQueryNumber::numberWithDouble(value);
 }
 
+// The shared special values are never retyped.
 Value XQueryMakeFloat(float value) {
   Ref<XQueryNumber> number = XQueryNumber::numberWithFloat(value);
   if (!XQueryNumber::isSpecial(number.get())) number->setType(XQueryTypeFloat);
@@ -116,22 +115,6 @@ Value XQueryMakeBase64Binary(std::string_view bytes) {
 
 namespace {
 
-struct FieldsOfType {
-  XQueryItemType type;
-  bool year, month, day, time;
-};
-
-constexpr std::array<FieldsOfType, 8> fieldsOfTypes = {{
-    {XQueryItemType::GYearMonth, true, true, false, false},
-    {XQueryItemType::GYear, true, false, false, false},
-    {XQueryItemType::GMonthDay, false, true, true, false},
-    {XQueryItemType::GDay, false, false, true, false},
-    {XQueryItemType::GMonth, false, true, false, false},
-    {XQueryItemType::DateTime, true, true, true, true},
-    {XQueryItemType::Date, true, true, true, false},
-    {XQueryItemType::Time, false, false, false, true},
-}};
-
 constexpr std::chrono::minutes widestZone = std::chrono::hours(14);
 
 // A field that is to be in a range, where the type has it.
@@ -141,24 +124,27 @@ struct FieldCheck {
   int64_t value, first, last;
 };
 
-Ref<XQueryError> fieldError(const FieldsOfType& fields, const XQueryDateTimeParts& parts) {
-  const int year = fields.year ? parts.year : 0;
+Ref<XQueryError> fieldError(XQueryItemType type, const XQueryDateTimeParts& parts) {
+  const int units = xqueryUnitsOfType(static_cast<XQueryTypeID>(type));
+  const bool hasMonth = (units & NSGregorianMonth) != 0;
+  const bool hasDay = (units & NSGregorianDay) != 0;
+  const bool hasTime = (units & NSGregorianTime) != 0;
+  const int year = units & NSGregorianYear ? parts.year : 0;
   const bool monthFits = parts.month >= 1 && parts.month <= 12;
-  const int lastDay = fields.month && monthFits ? daysInMonth(year, parts.month) : 31;
+  const int lastDay = hasMonth && monthFits ? daysInMonth(year, parts.month) : 31;
   const int64_t zone = parts.zone ? parts.zone->count() : 0;
   const FieldCheck checks[] = {
-      {"month", fields.month, parts.month, 1, 12},
-      {"day", fields.day, parts.day, 1, lastDay},
-      {"hour", fields.time, parts.hour, 0, 23},
-      {"minute", fields.time, parts.minute, 0, 59},
-      {"second", fields.time, parts.second, 0, 59},
-      {"nanosecond", fields.time, parts.nanosecond, 0, 999'999'999},
+      {"month", hasMonth, parts.month, 1, 12},
+      {"day", hasDay, parts.day, 1, lastDay},
+      {"hour", hasTime, parts.hour, 0, 23},
+      {"minute", hasTime, parts.minute, 0, 59},
+      {"second", hasTime, parts.second, 0, 59},
+      {"nanosecond", hasTime, parts.nanosecond, 0, 999'999'999},
       {"zone of minutes", true, zone, -widestZone.count(), widestZone.count()},
   };
   for (const FieldCheck& check : checks) {
     if (!check.isAsked || (check.value >= check.first && check.value <= check.last)) continue;
-    return XQueryErrors::fieldOutOfRange.error(check.name, check.value,
-                                               XQueryNameOfType(fields.type));
+    return XQueryErrors::fieldOutOfRange.error(check.name, check.value, XQueryNameOfType(type));
   }
   return nullptr;
 }
@@ -167,8 +153,7 @@ Ref<XQueryError> fieldError(const FieldsOfType& fields, const XQueryDateTimePart
 
 XQueryResult<Value> XQueryMakeDateOfType(XQueryItemType type, const XQueryDateTimeParts& parts) {
   if (!XQueryIsDateType(type)) return XQueryErrors::notADateType.error(XQueryNameOfType(type));
-  const size_t row = static_cast<size_t>(type) - static_cast<size_t>(XQueryItemType::GYearMonth);
-  if (auto error = fieldError(fieldsOfTypes[row], parts)) return error;
+  if (auto error = fieldError(type, parts)) return error;
   NSGregorianDate date;
   date.year = parts.year;
   date.month = static_cast<int8_t>(parts.month);
@@ -229,6 +214,10 @@ XQueryResult<Value> XQueryMakeDateTimeOf(std::chrono::sys_seconds second,
   if (given <= -most || given >= most || day.year < -years || day.year >= years) {
     return XQueryErrors::outOfTheRange.error(std::to_string(given) + " seconds", "xs:dateTime");
   }
+  if (fraction < nanoseconds(0) || fraction >= std::chrono::seconds(1)) {
+    return XQueryErrors::fieldOutOfRange.error("nanosecond", int64_t{fraction.count()},
+                                               "xs:dateTime");
+  }
   const int64_t time = floorRemainder(clock, secondsPerDay);
   XQueryDateTimeParts parts;
   parts.year = static_cast<int32_t>(day.year);
@@ -237,8 +226,7 @@ XQueryResult<Value> XQueryMakeDateTimeOf(std::chrono::sys_seconds second,
   parts.hour = static_cast<int>(time / 3600);
   parts.minute = static_cast<int>(time / 60 % 60);
   parts.second = static_cast<int>(time % 60);
-  parts.nanosecond =
-      static_cast<int>(std::clamp<int64_t>(fraction.count(), -1, std::numeric_limits<int>::max()));
+  parts.nanosecond = static_cast<int>(fraction.count());
   parts.zone = zone;
   return XQueryMakeDateOfType(XQueryItemType::DateTime, parts);
 }
@@ -265,9 +253,7 @@ XQueryResult<Value> XQueryMakeDuration(const XQueryDurationParts& parts) {
   if (!(parts.seconds >= 0) || std::isinf(parts.seconds)) {
     return secondsError(parts.seconds, "xs:duration");
   }
-  return XQueryDuration::durationWithFields({parts.isNegative, parts.years, parts.months,
-                                             parts.days, parts.hours, parts.minutes,
-                                             parts.seconds});
+  return XQueryDuration::durationWithParts(parts);
 }
 
 Value XQueryMakeYearMonthDuration(std::chrono::months months) {

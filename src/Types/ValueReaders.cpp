@@ -152,18 +152,14 @@ XQueryResult<std::string> XQueryReadBinary(const Value& value) {
 namespace {
 
 // The fields that the type has.
-XQueryDateTimeParts partsOf(const XQueryDate& date, Type type) {
-  using enum XQueryItemType;
+XQueryDateTimeParts partsOf(const XQueryDate& date) {
+  const int units = xqueryUnitsOfType(date.typeID());
   const NSGregorianDate fields = date.gregorianDate();
   XQueryDateTimeParts parts;
-  const bool hasTime = type == DateTime || type == Time;
-  const bool hasYear = type == DateTime || type == Date || type == GYearMonth || type == GYear;
-  const bool hasMonth = type != GYear && type != GDay && type != Time;
-  const bool hasDay = type == DateTime || type == Date || type == GMonthDay || type == GDay;
-  if (hasYear) parts.year = fields.year;
-  if (hasMonth) parts.month = fields.month;
-  if (hasDay) parts.day = fields.day;
-  if (hasTime) {
+  if (units & NSGregorianYear) parts.year = fields.year;
+  if (units & NSGregorianMonth) parts.month = fields.month;
+  if (units & NSGregorianDay) parts.day = fields.day;
+  if (units & NSGregorianTime) {
     parts.hour = fields.hour;
     parts.minute = fields.minute;
     parts.second = static_cast<int>(fields.second);
@@ -180,14 +176,14 @@ XQueryDateTimeParts partsOf(const XQueryDate& date, Type type) {
 XQueryResult<XQueryDateTimeParts> XQueryReadDateTimeParts(const Value& value) {
   const OneItem one(value);
   if (!XQueryIsDateType(one.type)) return one.otherThan("a date or time");
-  return partsOf(*cast<XQueryDate>(one.item), one.type);
+  return partsOf(*cast<XQueryDate>(one.item));
 }
 
 XQueryResult<std::chrono::year_month_day> XQueryReadDate(const Value& value) {
   using namespace std::chrono;
   const OneItem one(value);
   if (one.type != Type::Date) return one.otherThan("a date");
-  const XQueryDateTimeParts parts = partsOf(*cast<XQueryDate>(one.item), one.type);
+  const XQueryDateTimeParts parts = partsOf(*cast<XQueryDate>(one.item));
   if (parts.year < static_cast<int>(year::min()) || parts.year > static_cast<int>(year::max())) {
     return one.outOfRange("std::chrono::year");
   }
@@ -199,7 +195,7 @@ XQueryResult<std::chrono::nanoseconds> XQueryReadTime(const Value& value) {
   using namespace std::chrono;
   const OneItem one(value);
   if (one.type != Type::Time) return one.otherThan("a time");
-  const XQueryDateTimeParts parts = partsOf(*cast<XQueryDate>(one.item), one.type);
+  const XQueryDateTimeParts parts = partsOf(*cast<XQueryDate>(one.item));
   return hours(parts.hour) + minutes(parts.minute) + seconds(parts.second) +
          nanoseconds(parts.nanosecond);
 }

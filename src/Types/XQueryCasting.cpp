@@ -19,6 +19,7 @@
 #include "Types/XQueryValues.h"
 #include "xquery/Collection.h"
 #include "xquery/URL.h"
+#include "xquery/Values.h"
 #include "xquery/XQuery.h"
 
 #include <array>
@@ -65,31 +66,8 @@ Value stringToUntypedAtomic(const Cast& cast) {
   return plainString(cast.string());
 }
 
-using StringFactory = Ref<XQueryString> (*)(const NSString&);
-
-struct StringFactoryRow {
-  XQueryTypeID type;
-  StringFactory factory;
-};
-
-constexpr StringFactoryRow stringFactories[] = {
-    {XQueryTypeString, XQueryString::stringWithString},
-    {XQueryTypeNormalizedString, XQueryString::normalizedStringWithString},
-    {XQueryTypeToken, XQueryString::tokenWithString},
-    {XQueryTypeLanguage, XQueryString::languageWithString},
-    {XQueryTypeName, XQueryString::nameWithString},
-    {XQueryTypeNCName, XQueryString::ncNameWithString},
-    {XQueryTypeXSID, XQueryString::idWithString},
-    {XQueryTypeIDREF, XQueryString::idRefWithString},
-    {XQueryTypeENTITY, XQueryString::entityWithString},
-    {XQueryTypeNMTOKEN, XQueryString::nmTokenWithString},
-};
-
 Value stringToStringFamily(const Cast& cast) {
-  for (const StringFactoryRow& row : stringFactories) {
-    if (row.type == cast.target) return row.factory(cast.string());
-  }
-  return nullptr;
+  return XQueryString::stringOfType(cast.target, cast.string());
 }
 
 Value stringToBoolean(const Cast& cast) {
@@ -99,15 +77,8 @@ Value stringToBoolean(const Cast& cast) {
   return nullptr;
 }
 
-// The shared special values are never retyped: an infinite float is the shared infinity, a double.
-Value floatNumber(double value) {
-  Ref<XQueryNumber> number = XQueryNumber::numberWithFloat(static_cast<float>(value));
-  if (!XQueryNumber::isSpecial(number.get())) number->setType(XQueryTypeFloat);
-  return number;
-}
-
 Value doubleNumber(double value, XQueryTypeID target) {
-  if (target == XQueryTypeFloat) return floatNumber(value);
+  if (target == XQueryTypeFloat) return XQueryMakeFloat(static_cast<float>(value));
   return XQueryNumber::numberWithDouble(value);
 }
 

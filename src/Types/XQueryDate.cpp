@@ -2,6 +2,8 @@
 
 #include "Platform/Dates/GregorianCalendar.h"
 
+#include <iterator>
+
 namespace xquery {
 
 Ref<XQueryDate> XQueryDate::xqueryDateWithInstant(const NSInstant& instant,
@@ -43,25 +45,36 @@ Ref<NSTimeZone> XQueryDate::timeZoneForFields(const NSGregorianDate& date) const
   return NSTimeZone::timeZoneForSecondsFromGMT(offset);
 }
 
+int xqueryUnitsOfType(XQueryTypeID type) {
+  constexpr int year = NSGregorianYear;
+  constexpr int month = NSGregorianMonth;
+  constexpr int day = NSGregorianDay;
+  constexpr int time = NSGregorianTime;
+  static constexpr int units[] = {
+      year | month,               // gYearMonth
+      year,                       // gYear
+      month | day,                // gMonthDay
+      day,                        // gDay
+      month,                      // gMonth
+      year | month | day | time,  // dateTime
+      year | month | day,         // date
+      time,                       // time
+  };
+  static_assert(std::size(units) == XQueryTypeTime - XQueryTypeGYearMonth + 1);
+  return units[type - XQueryTypeGYearMonth];
+}
+
 NSGregorianDate xqueryFieldsForType(NSGregorianDate date, XQueryTypeID type) {
-  if (type == XQueryTypeDateTime) return date;
-  if (type == XQueryTypeTime) {
-    date.year = 0;
-    date.month = 0;
-    date.day = 0;
-    return date;
+  const int units = xqueryUnitsOfType(type);
+  const int8_t first = type == XQueryTypeTime ? 0 : 1;
+  if (!(units & NSGregorianYear)) date.year = 0;
+  if (!(units & NSGregorianMonth)) date.month = first;
+  if (!(units & NSGregorianDay)) date.day = first;
+  if (!(units & NSGregorianTime)) {
+    date.hour = 0;
+    date.minute = 0;
+    date.second = 0;
   }
-  date.hour = 0;
-  date.minute = 0;
-  date.second = 0;
-  const bool hasYear =
-      type == XQueryTypeDate || type == XQueryTypeGYearMonth || type == XQueryTypeGYear;
-  const bool hasMonth = type != XQueryTypeGYear && type != XQueryTypeGDay;
-  const bool hasDay =
-      type == XQueryTypeDate || type == XQueryTypeGMonthDay || type == XQueryTypeGDay;
-  if (!hasYear) date.year = 0;
-  if (!hasMonth) date.month = 1;
-  if (!hasDay) date.day = 1;
   return date;
 }
 

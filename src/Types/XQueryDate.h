@@ -88,6 +88,9 @@ class XQueryDate : public NSDate {
   Ref<NSTimeZone> _timeZone;
 };
 
+// Which fields a type of this family has, as NSGregorianUnits.
+int xqueryUnitsOfType(XQueryTypeID type);
+
 // The fields with those that the type does not have at their resting values.
 NSGregorianDate xqueryFieldsForType(NSGregorianDate date, XQueryTypeID type);
 

@@ -1,5 +1,5 @@
-// The lexical forms of dates and times. All eight are read by one procedure, which is told the
-// fields that the type has. Numbers are of digits only and nothing is skipped.
+// The lexical forms of dates and times. All eight are read by one procedure, which asks for
+// the fields that the type has. Numbers are of digits only and nothing is skipped.
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Dates/GregorianCalendar.h"
 #include "Platform/Numbers/NumberText.h"
@@ -17,7 +17,8 @@ class DateReader {
   explicit DateReader(NSStringView text) : _text(text) {}
 
   // Null unless the whole text was of the form.
-  Ref<XQueryDate> read(XQueryTypeID type, int units) {
+  Ref<XQueryDate> read(XQueryTypeID type) {
+    const int units = xqueryUnitsOfType(type);
     NSGregorianDate date;
     Ref<NSTimeZone> zone;
     const bool hasDate = (units & ~NSGregorianTime) != 0;
@@ -121,43 +122,38 @@ class DateReader {
   bool _negativeYear = false;
 };
 
-constexpr int year = NSGregorianYear;
-constexpr int month = NSGregorianMonth;
-constexpr int day = NSGregorianDay;
-constexpr int time = NSGregorianTime;
-
 }  // namespace
 
 Ref<XQueryDate> XQueryDate::xqueryDateTimeFromString(NSStringView text) {
-  return DateReader(text).read(XQueryTypeDateTime, year | month | day | time);
+  return DateReader(text).read(XQueryTypeDateTime);
 }
 
 Ref<XQueryDate> XQueryDate::xqueryDateFromString(NSStringView text) {
-  return DateReader(text).read(XQueryTypeDate, year | month | day);
+  return DateReader(text).read(XQueryTypeDate);
 }
 
 Ref<XQueryDate> XQueryDate::xqueryTimeFromString(NSStringView text) {
-  return DateReader(text).read(XQueryTypeTime, time);
+  return DateReader(text).read(XQueryTypeTime);
 }
 
 Ref<XQueryDate> XQueryDate::xqueryGMonthYearFromString(NSStringView text) {
-  return DateReader(text).read(XQueryTypeGYearMonth, year | month);
+  return DateReader(text).read(XQueryTypeGYearMonth);
 }
 
 Ref<XQueryDate> XQueryDate::xqueryGYearFromString(NSStringView text) {
-  return DateReader(text).read(XQueryTypeGYear, year);
+  return DateReader(text).read(XQueryTypeGYear);
 }
 
 Ref<XQueryDate> XQueryDate::xqueryGMonthDayFromString(NSStringView text) {
-  return DateReader(text).read(XQueryTypeGMonthDay, month | day);
+  return DateReader(text).read(XQueryTypeGMonthDay);
 }
 
 Ref<XQueryDate> XQueryDate::xqueryGDayFromString(NSStringView text) {
-  return DateReader(text).read(XQueryTypeGDay, day);
+  return DateReader(text).read(XQueryTypeGDay);
 }
 
 Ref<XQueryDate> XQueryDate::xqueryGMonthFromString(NSStringView text) {
-  return DateReader(text).read(XQueryTypeGMonth, month);
+  return DateReader(text).read(XQueryTypeGMonth);
 }
 
 }  // namespace xquery

@@ -2,6 +2,7 @@
 
 #include "Platform/Numbers/NumberText.h"
 #include "Types/DurationReader.h"
+#include "xquery/Values.h"
 
 #include <cmath>
 #include <limits>
@@ -83,15 +84,15 @@ Ref<XQueryDuration> XQueryDuration::durationWithString(NSStringView text) {
   return duration;
 }
 
-Ref<XQueryDuration> XQueryDuration::durationWithFields(const Fields& fields) {
+Ref<XQueryDuration> XQueryDuration::durationWithParts(const XQueryDurationParts& parts) {
   Ref<XQueryDuration> duration = make<XQueryDuration>();
-  duration->_isNeg = fields.isNeg;
-  duration->_year = fields.year;
-  duration->_month = fields.month;
-  duration->_day = fields.day;
-  duration->_hour = fields.hour;
-  duration->_minute = fields.minute;
-  duration->_second = fields.second;
+  duration->_isNeg = parts.isNegative;
+  duration->_year = parts.years;
+  duration->_month = parts.months;
+  duration->_day = parts.days;
+  duration->_hour = parts.hours;
+  duration->_minute = parts.minutes;
+  duration->_second = parts.seconds;
   return duration;
 }
 

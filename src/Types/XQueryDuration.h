@@ -9,6 +9,8 @@
 
 namespace xquery {
 
+struct XQueryDurationParts;
+
 class XQueryDuration : public NSCounted {
  public:
   static bool classof(const NSObject& object) { return object.kind() == Kind::Duration; }
@@ -16,17 +18,8 @@ class XQueryDuration : public NSCounted {
   // Null for any deviation from the lexical form, and for a field beyond 32 bits.
   [[nodiscard]] static Ref<XQueryDuration> durationWithString(NSStringView text);
 
-  // What is written of one; no field is below 0.
-  struct Fields {
-    bool isNeg = false;
-    int32_t year = 0;
-    int32_t month = 0;
-    int32_t day = 0;
-    int32_t hour = 0;
-    int32_t minute = 0;
-    double second = 0;
-  };
-  [[nodiscard]] static Ref<XQueryDuration> durationWithFields(const Fields& fields);
+  // Unchecked: the caller knows that none of them is below 0.
+  [[nodiscard]] static Ref<XQueryDuration> durationWithParts(const XQueryDurationParts& parts);
 
   XQueryTypeID typeID() const { return XQueryTypeDuration; }
   bool isNeg() const { return _isNeg; }

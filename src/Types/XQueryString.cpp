@@ -121,4 +121,27 @@ Ref<XQueryString> XQueryString::nmTokenWithString(const NSString& text) {
   return typedString(isNMToken(text.view()), text, XQueryTypeNMTOKEN);
 }
 
+Ref<XQueryString> XQueryString::stringOfType(XQueryTypeID type, const NSString& text) {
+  struct Row {
+    XQueryTypeID type;
+    Ref<XQueryString> (*factory)(const NSString&);
+  };
+  static constexpr Row rows[] = {
+      {XQueryTypeString, stringWithString},
+      {XQueryTypeNormalizedString, normalizedStringWithString},
+      {XQueryTypeToken, tokenWithString},
+      {XQueryTypeLanguage, languageWithString},
+      {XQueryTypeName, nameWithString},
+      {XQueryTypeNCName, ncNameWithString},
+      {XQueryTypeXSID, idWithString},
+      {XQueryTypeIDREF, idRefWithString},
+      {XQueryTypeENTITY, entityWithString},
+      {XQueryTypeNMTOKEN, nmTokenWithString},
+  };
+  for (const Row& row : rows) {
+    if (row.type == type) return row.factory(text);
+  }
+  return nullptr;
+}
+
 }  // namespace xquery

@@ -33,6 +33,8 @@ class XQueryString : public NSString {
   [[nodiscard]] static Ref<XQueryString> idRefWithString(const NSString& text);
   [[nodiscard]] static Ref<XQueryString> entityWithString(const NSString& text);
   [[nodiscard]] static Ref<XQueryString> nmTokenWithString(const NSString& text);
+  // Of xs:string or a type derived from it; null for the lists, too.
+  [[nodiscard]] static Ref<XQueryString> stringOfType(XQueryTypeID type, const NSString& text);
   // For a caller that has checked already.
   [[nodiscard]] static Ref<XQueryString> stringWithView(NSStringView text);
 

@@ -49,6 +49,14 @@ TEST(ValueFromText, DecimalsOfManyDigitsAndOfTooMany) {
             "error \"" + std::string(80, '7') + "...\" is out of the range of xs:integer");
 }
 
+TEST(ValueFromText, OfALongTextTheBeginningIsShown) {
+  const std::string eighty(80, 'x');
+  expectRefused(Type::Boolean, {eighty.c_str()});
+  const std::string whole = eighty.substr(1);
+  EXPECT_EQ(shownFrom(Type::Boolean, whole + "ä"), notOfTheForm(whole + "...", "xs:boolean"));
+  EXPECT_EQ(shownFrom(Type::Boolean, eighty + "ä"), notOfTheForm(eighty + "...", "xs:boolean"));
+}
+
 TEST(ValueFromText, IntegersOfEachRange) {
   struct Row {
     Type type;
@@ -241,6 +249,8 @@ TEST(ValueFromText, TheEndOfADayIsTheBeginningOfTheNextDate) {
             "xs:dateTime 2003-03-01T00:00:00");
   EXPECT_EQ(shownFrom(Type::DateTime, "1999-12-31T24:00:00-05:00"),
             "xs:dateTime 2000-01-01T00:00:00-05:00");
+  EXPECT_EQ(shownFrom(Type::DateTime, "-0001-12-31T24:00:00Z"), "xs:dateTime 0000-01-01T00:00:00Z");
+  EXPECT_EQ(shownFrom(Type::DateTime, "1900-02-28T24:00:00Z"), "xs:dateTime 1900-03-01T00:00:00Z");
   EXPECT_EQ(shownFrom(Type::Time, "24:00:00Z"), "xs:time 00:00:00Z");
   EXPECT_EQ(shownFrom(Type::DateTime, "2147483647-12-31T24:00:00Z"),
             "error \"2147483647-12-31T24:00:00Z\" is out of the range of xs:dateTime");

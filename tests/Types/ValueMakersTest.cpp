@@ -127,8 +127,18 @@ TEST(ValueMakers, DateTimesOfInstants) {
             "error -9223372036854775808 seconds is out of the range of xs:dateTime");
   EXPECT_EQ(shown(XQueryMakeDateTime(sys_seconds(0s), minutes::min())).substr(0, 21),
             "error zone of minutes");
+  EXPECT_EQ(shown(XQueryMakeDateTime(sys_seconds(-67768100567971200s))),
+            "xs:dateTime -2147483648-01-01T00:00:00Z");
+  EXPECT_EQ(shown(XQueryMakeDateTime(sys_seconds(-67768100567971201s))),
+            "error -67768100567971201 seconds is out of the range of xs:dateTime");
+  EXPECT_EQ(shown(XQueryMakeDateTime(sys_seconds(67767976233532799s), 1min)),
+            "error 67767976233532799 seconds is out of the range of xs:dateTime");
   EXPECT_EQ(shown(XQueryMakeDateTimeOf(sys_seconds(0s), 1s, 0min)),
             "error nanosecond 1000000000 of xs:dateTime is out of range");
+  EXPECT_EQ(shown(XQueryMakeDateTimeOf(sys_seconds(0s), -1ns, 0min)),
+            "error nanosecond -1 of xs:dateTime is out of range");
+  EXPECT_EQ(shown(XQueryMakeDateTimeOf(sys_seconds(0s), 5s, 0min)),
+            "error nanosecond 5000000000 of xs:dateTime is out of range");
 }
 
 TEST(ValueMakers, DatePartsOfNoDateType) {

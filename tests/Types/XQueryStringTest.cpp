@@ -108,6 +108,20 @@ TEST(XQueryString, EachFactoryAnswersNullForTextThatDoesNotFit) {
   }
 }
 
+TEST(XQueryString, OfATypeIsWhatItsFactoryMakes) {
+  for (const FactoryRow& row : factoryRows) {
+    const Ref<XQueryString> string = XQueryString::stringOfType(row.type, *text(row.accepted));
+    ASSERT_TRUE(string) << row.name;
+    EXPECT_EQ(string->typeID(), row.type) << row.name;
+    if (!row.refused) continue;
+    EXPECT_FALSE(XQueryString::stringOfType(row.type, *text(row.refused))) << row.name;
+  }
+  for (const XQueryTypeID type : {XQueryTypeIDREFS, XQueryTypeENTITIES, XQueryTypeNMTOKENS,
+                                  XQueryTypeUntypedAtomic, XQueryTypeInteger}) {
+    EXPECT_FALSE(XQueryString::stringOfType(type, *text("a"))) << type;
+  }
+}
+
 TEST(XQueryString, LongAndWideTextSurvivesTyping) {
   const std::string longText(1000, 'x');
   EXPECT_EQ(XQueryString::tokenWithString(*text(longText))->utf8(), longText);
