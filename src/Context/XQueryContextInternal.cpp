@@ -38,10 +38,10 @@ XQueryContextInternal::XQueryContextInternal(XQueryContext& owner)
 XQueryContextInternal::~XQueryContextInternal() = default;
 
 void XQueryContextInternal::takeSettings(XQueryContextInternal& of) {
+  setLoading(of.loader().loading());  // the one that may find no memory
   _contextNamespaces = std::move(of._contextNamespaces);
   _client = std::move(of._client);
   _limits = std::move(of._limits);
-  setLoading(of.loader().loading());
 }
 
 NSObject* XQueryContextInternal::globalForQName(const XQueryQName& qName) const {

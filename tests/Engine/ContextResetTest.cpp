@@ -34,11 +34,38 @@ class CountingLoader : public XQueryLoader {
 
 TEST(ContextReset, ForgetsTheContextItem) {
   const auto context = XQueryContext::xqueryContext();
+  const std::string withoutItem = answer(*context, "string(/a)");
+  const std::string withoutPlace = answer(*context, "position(), last()");
   const auto document = NSXMLDocument::documentWithData("<a>7</a>", NSXMLNodeOptionsNone);
   EXPECT_EQ(answer(*context, "string(/a)", document), "7;");
   EXPECT_EQ(answer(*context, "string(/a)"), "7;");
   EXPECT_TRUE(context->contextReset());
-  EXPECT_NE(answer(*context, "string(/a)"), "7;");
+  EXPECT_EQ(answer(*context, "string(/a)"), withoutItem);
+  EXPECT_NE(withoutItem, "7;");
+  EXPECT_EQ(answer(*context, "position(), last()"), withoutPlace);
+}
+
+TEST(ContextReset, ForgetsTheBaseURIsOfConstructedNodes) {
+  const auto context = XQueryContext::xqueryContext();
+  const auto query = compiled("declare base-uri 'http://b/'; <first/>, <a/>");
+  const auto items = context->evaluateXQuery(*query, {}, {});
+  ASSERT_TRUE(items);
+  const Value node = items->objects().back();
+  EXPECT_EQ(answer(*context, "string(base-uri(.))", node), "http://b/;");
+  EXPECT_TRUE(context->contextReset());
+  EXPECT_EQ(answer(*context, "string(base-uri(.))", node), ";");
+}
+
+TEST(ContextReset, ForgetsTheProfile) {
+  const auto context = XQueryContext::xqueryContext();
+  const auto query =
+      XQuery::xqueryWithSource("1 + 1", XQueryLoading(), XQueryLimits(), XQueryWay::Profiled);
+  XQueryProfile profile(*query);
+  ASSERT_TRUE(context->evaluateXQuery(*query, {}, {}));
+  EXPECT_TRUE(profile.add(*context));
+  EXPECT_TRUE(context->contextReset());
+  EXPECT_FALSE(profile.add(*context));
+  EXPECT_EQ(profile.evaluations(), 1u);
 }
 
 TEST(ContextReset, LetsTheClockGoOn) {
