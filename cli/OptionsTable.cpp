@@ -101,8 +101,9 @@ void takeDocument(const OptionRow& row, const std::string& text, Options& option
 void takeNamespace(const OptionRow& row, const std::string& text, Options& options) {
   needText(row, text);
   const Binding binding = split(row, text);
-  const bool isPrefix = binding.name.find(':') == std::string::npos && isVariableName(binding.name);
-  if (!binding.name.empty() && !isPrefix) refuse(row, "a prefix, \"=\" and a URI", text);
+  if (!binding.name.empty() && !isUnprefixedName(binding.name)) {
+    refuse(row, "a prefix, \"=\" and a URI", text);
+  }
   options.namespaces[binding.name] = binding.value;
 }
 

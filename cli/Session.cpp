@@ -137,7 +137,7 @@ Session::Session(const Options& options)
   }
   // What the options bind need not be declared again, where its name has no prefix of the user's.
   for (const auto& [name, value] : _constants) {
-    if (isVariableName(name) && name.find(':') == name.npos) {
+    if (isUnprefixedName(name)) {
       _declarations.add("declare variable $" + name + " external;");
     }
   }

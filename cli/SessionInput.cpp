@@ -290,12 +290,14 @@ DeclarationName declarationName(std::string_view declaration) {
   return {Kind::Setting, second};
 }
 
+bool isUnprefixedName(std::string_view text) {
+  return !text.empty() && isNameStart(text.front()) && std::ranges::all_of(text, isNameByte);
+}
+
 bool isVariableName(std::string_view text) {
-  const size_t colon = std::min(text.find(':'), text.size());
-  if (colon < text.size() && !isVariableName(text.substr(colon + 1))) return false;
-  const std::string name(text.substr(0, colon));
-  const bool hasOneColon = text.find(':', colon + 1) == text.npos || colon == text.size();
-  return hasOneColon && variablesIn("$" + name) == std::vector<std::string>{name};
+  const size_t colon = text.find(':');
+  if (colon == text.npos) return isUnprefixedName(text);
+  return isUnprefixedName(text.substr(0, colon)) && isUnprefixedName(text.substr(colon + 1));
 }
 
 std::vector<std::string> variablesIn(std::string_view text) {

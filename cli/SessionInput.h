@@ -33,6 +33,9 @@ struct DeclarationName {
 };
 DeclarationName declarationName(std::string_view declaration);
 
+// Whether this is a name without a colon, as prefixes are.
+bool isUnprefixedName(std::string_view text);
+
 // Whether this is what stands behind a dollar sign: a name, with a prefix or without.
 bool isVariableName(std::string_view text);
 

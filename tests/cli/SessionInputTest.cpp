@@ -100,6 +100,26 @@ TEST(Declarations, AreKnownByTheirNames) {
   EXPECT_EQ(declarationName("").kind, Kind::Setting);
 }
 
+TEST(Names, HaveAPrefixOrNone) {
+  for (const std::string text : {"a", "\u00E9-1", "_a.b"}) {
+    EXPECT_TRUE(cli::isUnprefixedName(text)) << text;
+    EXPECT_TRUE(cli::isVariableName(text)) << text;
+    EXPECT_TRUE(cli::isVariableName("p:" + text)) << text;
+    EXPECT_FALSE(cli::isUnprefixedName("p:" + text)) << text;
+  }
+  for (const std::string text :
+       {"", ":", "a:", ":a", "a::b", "a:b:c", "1a", "a:1", "-a", "a b", " a", "a$a", "(::)a"}) {
+    EXPECT_FALSE(cli::isVariableName(text)) << text;
+    EXPECT_FALSE(cli::isUnprefixedName(text)) << text;
+  }
+}
+
+TEST(Names, HaveOnePrefixHoweverManyAreWritten) {
+  std::string text;
+  for (int n = 0; n < 1'000'000; ++n) text += "a:";
+  EXPECT_FALSE(cli::isVariableName(text + "b"));
+}
+
 TEST(Declarations, StandInTheOrderOfTheGrammar) {
   cli::Declarations all;
   for (const char* each : {"declare variable $a := 1;", "declare function local:f() { $a };",
