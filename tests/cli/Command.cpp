@@ -100,6 +100,10 @@ Outcome shell(const std::string& script, const std::vector<std::string>& argumen
   return start("/bin/sh", all);
 }
 
+std::string waitUntil(const std::string& condition) {
+  return "n=0; until " + condition + " || [ $n -gt 3000 ]; do sleep 0.01; n=$((n + 1)); done; ";
+}
+
 std::string withoutPlaces(const std::string& err) {
   std::string result;
   for (size_t at = 0; at < err.size();) {

@@ -31,6 +31,9 @@ Outcome xquery(const std::vector<std::string>& arguments, const std::string& inp
 // A shell runs `script`, in which "$0" is the xquery command and "$1" and so on are the arguments.
 Outcome shell(const std::string& script, const std::vector<std::string>& arguments = {});
 
+// For a script: waits until the condition, a command of the shell, holds; half a minute at most.
+std::string waitUntil(const std::string& condition);
+
 // What standard error says without the lines that tell where in the query an error arose.
 std::string withoutPlaces(const std::string& err);
 

@@ -161,13 +161,19 @@ TEST_F(ProfileCommand, IsWrittenAtATimeLimit) {
   EXPECT_EQ(jsonMember(content("p.json"), "failures"), "1");
 }
 
+// What becomes of the command where it is interrupted after so many seconds of the endless query;
+// "$1" is the folder.
+Outcome interrupted(const std::string& arguments, const std::string& folder,
+                    const std::string& seconds) {
+  return command::start(
+      "/bin/bash", {"-mc",
+                    "env --default-signal=INT \"$0\" --profile \"$1/p.json\" -e \"$2\" " +
+                        arguments + " & pid=$!; sleep " + seconds + "; kill -INT $pid; wait $pid",
+                    XQUERY_BINARY_DIR "/xquery", folder, endless});
+}
+
 TEST_F(ProfileCommand, IsWrittenAtAnInterrupt) {
-  const Outcome outcome = command::start(
-      "/bin/bash",
-      {"-mc",
-       "env --default-signal=INT \"$0\" --profile \"$1/p.json\" -o \"$1/out\" -e \"$2\" & pid=$!; "
-       "sleep 0.7; kill -INT $pid; wait $pid",
-       XQUERY_BINARY_DIR "/xquery", path(""), endless});
+  const Outcome outcome = interrupted("-o \"$1/out\"", path(""), "0.7");
   EXPECT_EQ(outcome.status, 130) << outcome.err;
   EXPECT_EQ(jsonMember(content("p.json"), "evaluations"), "1");
   EXPECT_EQ(jsonMember(content("p.json"), "failures"), "1");
@@ -176,12 +182,7 @@ TEST_F(ProfileCommand, IsWrittenAtAnInterrupt) {
 
 TEST_F(ProfileCommand, AtAnInterruptHasWhatAllThreadsMeasured) {
   for (const char* name : {"a.xml", "b.xml", "c.xml"}) std::ofstream(path(name)) << "<a/>";
-  const Outcome outcome = command::start(
-      "/bin/bash",
-      {"-mc",
-       "env --default-signal=INT \"$0\" --jobs 3 --profile \"$1/p.json\" -e \"$2\" \"$1\"/?.xml & "
-       "pid=$!; sleep 1.5; kill -INT $pid; wait $pid",
-       XQUERY_BINARY_DIR "/xquery", path(""), endless});
+  const Outcome outcome = interrupted("--jobs 3 \"$1\"/?.xml", path(""), "1.5");
   EXPECT_EQ(outcome.status, 130) << outcome.err;
   EXPECT_EQ(jsonMember(content("p.json"), "evaluations"), "3");
   EXPECT_EQ(jsonMember(content("p.json"), "inputs"), "3");

@@ -13,6 +13,7 @@ using command::Outcome;
 using command::readFile;
 using command::shell;
 using command::TemporaryDirectory;
+using command::waitUntil;
 using command::xquery;
 using testing::HasSubstr;
 using testing::StartsWith;
@@ -260,15 +261,15 @@ TEST(SplitCommand, LeavesWholePiecesAtAnInterrupt) {
   for (const std::string signal : {"INT", "TERM"}) {
     const TemporaryDirectory directory;
     const std::string folder = directory.path("parts");
-    const Outcome outcome = shell(
-        "(n=0; until [ -e \"$1/part-00000003.xml\" ] || [ $n -gt 3000 ]; do sleep 0.01; "
-        "n=$((n + 1)); done; kill -s $2 $(cat \"$1.pid\")) & "
-        "{ printf '<a>'; exec yes '<b>text</b>'; } | "
-        "sh -c 'echo $$ > \"$1.pid\"; exec \"$0\" --split /a/b --records 1000 - \"$1\"' "
-        "\"$0\" \"$1\" > \"$1.names\" 2> \"$1.messages\"; wait; "
-        "ls -A \"$1\" | grep -vc '^part-[0-9]*.xml$'; cat \"$1.messages\"; "
-        "xargs cat < \"$1.names\" 2>&1 > \"$1.all\"; tail -qn 1 \"$1\"/* | sort -u",
-        {folder, signal});
+    const Outcome outcome =
+        shell("(" + waitUntil("[ -e \"$1/part-00000003.xml\" ]") +
+                  "kill -s $2 $(cat \"$1.pid\")) & "
+                  "{ printf '<a>'; exec yes '<b>text</b>'; } | "
+                  "sh -c 'echo $$ > \"$1.pid\"; exec \"$0\" --split /a/b --records 1000 - \"$1\"' "
+                  "\"$0\" \"$1\" > \"$1.names\" 2> \"$1.messages\"; wait; "
+                  "ls -A \"$1\" | grep -vc '^part-[0-9]*.xml$'; cat \"$1.messages\"; "
+                  "xargs cat < \"$1.names\" 2>&1 > \"$1.all\"; tail -qn 1 \"$1\"/* | sort -u",
+              {folder, signal});
     EXPECT_EQ(outcome.out, "0\n</a>\n") << signal;
   }
 }
@@ -276,11 +277,10 @@ TEST(SplitCommand, LeavesWholePiecesAtAnInterrupt) {
 TEST(SplitCommand, NamesAPieceBeforeTheNextOneIsRead) {
   const TemporaryDirectory directory;
   const std::string names = directory.write("names", "");
-  const Outcome outcome = shell(
-      "{ printf '<a><b>1</b><b>'; n=0; until [ -s \"$1\" ] || [ $n -gt 1000 ]; do sleep 0.01; "
-      "n=$((n + 1)); done; cat \"$(cat \"$1\")\" > \"$1.seen\"; echo '</b></a>'; } | "
-      "\"$0\" --split /a/b --records 1 - \"$2\" > \"$1\"",
-      {names, directory.path("parts")});
+  const Outcome outcome = shell("{ printf '<a><b>1</b><b>'; " + waitUntil("[ -s \"$1\" ]") +
+                                    "cat \"$(cat \"$1\")\" > \"$1.seen\"; echo '</b></a>'; } | "
+                                    "\"$0\" --split /a/b --records 1 - \"$2\" > \"$1\"",
+                                {names, directory.path("parts")});
   EXPECT_EQ(outcome.status, 0);
   EXPECT_EQ(readFile(names + ".seen"), declaration + "<a>\n<b>1</b>\n</a>\n");
 }

@@ -10,6 +10,7 @@
 using command::Outcome;
 using command::shell;
 using command::TemporaryDirectory;
+using command::waitUntil;
 using command::xquery;
 using testing::HasSubstr;
 
@@ -107,11 +108,10 @@ TEST(StreamCommand, WritesWhatItHasBeforeItWaits) {
   const TemporaryDirectory directory;
   const std::string file = directory.write("out", "");
   // The end comes when the item has been seen.
-  const Outcome outcome = shell(
-      "{ printf '<a><b>1</b>'; n=0; until [ -s \"$1\" ] || [ $n -gt 1000 ]; do sleep 0.01; "
-      "n=$((n + 1)); done; [ -s \"$1\" ] && echo '</a>'; } | "
-      "\"$0\" --stream -e /a/b - > \"$1\"",
-      {file});
+  const Outcome outcome = shell("{ printf '<a><b>1</b>'; " + waitUntil("[ -s \"$1\" ]") +
+                                    "[ -s \"$1\" ] && echo '</a>'; } | "
+                                    "\"$0\" --stream -e /a/b - > \"$1\"",
+                                {file});
   EXPECT_EQ(outcome.status, 0);
   EXPECT_EQ(command::readFile(file), "<b>1</b>\n");
 }
