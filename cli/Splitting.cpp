@@ -130,7 +130,9 @@ void interpretSplit(Options& options) {
   if (!options.splitPath) throw WrongUsage("--records requires --split PATH");
   checkOptions(options);
   if (options.records == 0) throw WrongUsage("--split requires --records N");
-  if (options.inputs.size() != 2) throw WrongUsage("--split requires one INPUT and a FOLDER");
+  if (options.inputs.size() != 2 || options.inputs.back().empty()) {
+    throw WrongUsage("--split requires one INPUT and a FOLDER");
+  }
   options.splitFolder = options.inputs.back();
   options.inputs.pop_back();
   options.queryText = options.splitPath;

@@ -187,6 +187,7 @@ TEST(SplitCommand, WantsToBeUsedRightly) {
   EXPECT_EQ(status({"--records", "1", "-e", "/a", "-"}), 2);
   EXPECT_EQ(status({"--split", "/a", "--records", "1", "-"}), 2);
   EXPECT_EQ(status({"--split", "/a", "--records", "1", "-", folder, "more"}), 2);
+  EXPECT_EQ(status({"--split", "/a", "--records", "1", "-", ""}), 2);
   for (const std::string number : {"0", "-1", "1.5", "1000000001", "x"}) {
     EXPECT_EQ(status({"--split", "/a", "--records", number, "-", folder}), 2) << number;
   }
