@@ -16,6 +16,6 @@ trap 'rm -f "$log"' EXIT
 status=${PIPESTATUS[0]}
 grep -E 'tests? failed out of' "$log"
 # The closing lines of the tests that pytest ran.
-grep -hE '^[0-9]+ (passed|failed|skipped).* in [0-9.]+s' \
+grep -hE '^[0-9]+ (passed|failed|skipped|errors?).* in [0-9.]+s' \
   "$top/build/$preset/Testing/Temporary/LastTest.log" 2>/dev/null
 exit "$status"
