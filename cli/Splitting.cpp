@@ -1,16 +1,13 @@
 #include "Splitting.h"
 
 #include "Documents.h"
-#include "Evaluation.h"
 #include "Inputs.h"
-#include "Messages.h"
-#include "MissingDocuments.h"
 #include "OptionsTable.h"
 #include "Output.h"
 #include "Pieces.h"
+#include "Streaming.h"
 
 #include <filesystem>
-#include <memory>
 #include <optional>
 #include <string>
 #include <system_error>
@@ -35,7 +32,6 @@ class Split {
  public:
   explicit Split(const Options& options)
       : _options(options),
-        _path(options.inputs.front()),
         _pieces(*options.splitFolder, options.records,
                 [this](const std::string& path) { tellOfPiece(path); }) {}
 
@@ -53,19 +49,17 @@ class Split {
       return false;
     }
   }
-  void add(const Value& item);
   void tellOfPiece(const std::string& path);
   void evaluate(const XQuery& query, const XQueryConstants& constants);
 
   const Options& _options;
-  const std::string _path;
   Output _names;
   Pieces _pieces;
   std::optional<Failure> _failure;
 };
 
 void Split::run(const XQuery& query, const XQueryConstants& constants) {
-  refuseOutputAsInput(_options, _path);
+  refuseOutputAsInput(_options, _options.inputs.front());
   prepareFolder(*_options.splitFolder);
   if (!_names.open(std::nullopt)) throw writingFailure(std::nullopt, _names.error());
   evaluate(query, constants);
@@ -74,27 +68,12 @@ void Split::run(const XQuery& query, const XQueryConstants& constants) {
 }
 
 void Split::evaluate(const XQuery& query, const XQueryConstants& constants) {
-  Evaluation evaluation(_options, std::make_shared<MissingDocuments>(_options));
-  DocumentProgress progress(_options, _path);
   XQueryStreamInput input;
-  input.path = _path;
-  input.options = readingMode(_options);
-  input.progress = progress.callback();
   input.beforeRecord = [this](size_t elementsKept) { _pieces.beginRecord(elementsKept); };
-  const auto receive = [this](const Value& item) { return isDone([&] { add(item); }); };
-  XQueryStreamFailure failure;
-  const bool isWhole = evaluation.evaluateStream(query, constants, input, receive, failure);
+  const auto receive = [this](const Value& item) { return isDone([&] { _pieces.add(*item); }); };
+  const auto failure = evaluateRecords(_options, query, constants, std::move(input), receive);
   if (_failure) throw *_failure;
-  if (isWhole) return;
-  if (!failure.error) throw readingFailure(_path, failure.reading);
-  throw Failure{StatusQueryError, description(*failure.error), {failure.error}};
-}
-
-void Split::add(const Value& item) {
-  if (auto* error = dyn_cast<NSError>(item.get())) {
-    throw Failure{StatusQueryError, description(*error), {Ref<NSError>(error)}};
-  }
-  _pieces.add(*item);
+  if (failure) throw *failure;
 }
 
 // At once, for whoever works on a piece while the next one is made.

@@ -1,6 +1,5 @@
 #include "Streaming.h"
 
-#include "Documents.h"
 #include "Evaluation.h"
 #include "Inputs.h"
 #include "ItemWriter.h"
@@ -11,8 +10,8 @@
 #include "Results.h"
 #include "Signals.h"
 
-#include <optional>
 #include <string>
+#include <utility>
 
 namespace cli {
 namespace {
@@ -45,7 +44,6 @@ class Stream {
   Results _results;
   ResultPart _part;
   ItemWriter _writer;
-  Ref<NSError> _errorItem;  // ends the stream as a failure does
   bool _hasBegun = false, _hasItems = false, _isTrue = false;
 };
 
@@ -53,32 +51,15 @@ Status Stream::run(const XQueryConstants& constants, Phases& phases) {
   return finish(phases.evaluate.measure([&] { return evaluate(constants); }));
 }
 
-// The line of progress is gone when it ends.
 std::optional<Failure> Stream::evaluate(const XQueryConstants& constants) {
   refuseOutputAsInput(_options, _path);
-  Evaluation evaluation(_options, std::make_shared<MissingDocuments>(_options));
-  DocumentProgress progress(_options, _path);
   XQueryStreamInput input;
-  input.path = _path;
-  input.options = readingMode(_options);
-  input.progress = progress.callback();
   input.beforeWaiting = [this] { _results.flush(); };
-  XQueryStreamFailure failure;
-  const bool isWhole = evaluation.evaluateStream(
-      _query, constants, input, [this](const Value& item) { return receive(item); }, failure);
-  if (_errorItem) return Failure{StatusQueryError, description(*_errorItem), {_errorItem}};
-  if (isWhole) return std::nullopt;
-  if (failure.error) {
-    return Failure{StatusQueryError, description(*failure.error), {failure.error}};
-  }
-  // Nothing has failed where nothing more could be written.
-  if (failure.reading.message.empty()) return std::nullopt;
-  return readingFailure(_path, failure.reading);
+  return evaluateRecords(_options, _query, constants, std::move(input),
+                         [this](const Value& item) { return receive(item); });
 }
 
 bool Stream::receive(const Value& item) {
-  _errorItem = Ref<NSError>(dyn_cast<NSError>(item.get()));
-  if (_errorItem) return false;
   if (_options.exitStatus) _isTrue = _hasItems || isTrue(NSArray::arrayWithObjects({item}).get());
   _hasItems = true;
   beginOnce();
@@ -122,6 +103,33 @@ void checkStream(const Options& options) {
   if (options.inputs.size() != 1 || options.filesFrom) refuse("requires one INPUT");
   if (options.html) refuse("excludes --html");
   if (options.repeat > 1) refuse("excludes --repeat");
+}
+
+// The line of progress is gone when it ends.
+std::optional<Failure> evaluateRecords(const Options& options, const XQuery& query,
+                                       const XQueryConstants& constants, XQueryStreamInput input,
+                                       const std::function<bool(const Value& item)>& receive) {
+  const std::string& path = options.inputs.front();
+  Evaluation evaluation(options, std::make_shared<MissingDocuments>(options));
+  DocumentProgress progress(options, path);
+  input.path = path;
+  input.options = readingMode(options);
+  input.progress = progress.callback();
+  Ref<NSError> errorItem;  // ends the stream as a failure does
+  const auto receiveItem = [&](const Value& item) {
+    errorItem = Ref<NSError>(dyn_cast<NSError>(item.get()));
+    return !errorItem && receive(item);
+  };
+  XQueryStreamFailure failure;
+  const bool isWhole = evaluation.evaluateStream(query, constants, input, receiveItem, failure);
+  if (errorItem) return Failure{StatusQueryError, description(*errorItem), {errorItem}};
+  if (isWhole) return std::nullopt;
+  if (failure.error) {
+    return Failure{StatusQueryError, description(*failure.error), {failure.error}};
+  }
+  // Nothing has failed where the receiver wanted no more.
+  if (failure.reading.message.empty()) return std::nullopt;
+  return readingFailure(path, failure.reading);
 }
 
 Status runStream(const Options& options, const XQuery& query, const XQueryConstants& constants,
