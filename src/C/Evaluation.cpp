@@ -43,9 +43,10 @@ xq_status xq_evaluate(xq_context* context, const xq_query* query, xq_value** ite
   if (!use) return XQ_USAGE;
   return guarded([&]() -> xq_status {
     try {
+      const Ref<XQuery> kept = query->query;  // a callback may free the handle
       Ref<XQueryError> failure;
-      const auto result = context->context->evaluateXQuery(*query->query, context->variables,
-                                                           context->item, &failure);
+      const auto result =
+          context->context->evaluateXQuery(*kept, context->variables, context->item, &failure);
       if (const auto found = XQueryFirstError(result, failure)) return giveError(error, found);
       return giveNew(items, itemsOf(result));
     } catch (const NSException& limit) {
@@ -80,8 +81,9 @@ class Receiver {
 
 xq_status stream(xq_context* context, const xq_query* query, const XQueryStreamInput& input,
                  Receiver receiver, xq_error** error) {
+  const Ref<XQuery> kept = query->query;  // a callback may free the handle
   XQueryStreamFailure failure;
-  const bool isComplete = context->context->evaluateStream(*query->query, context->variables, input,
+  const bool isComplete = context->context->evaluateStream(*kept, context->variables, input,
                                                            std::ref(receiver), failure);
   if (receiver.hasFailed()) return XQ_HOST;
   if (isComplete) return XQ_OK;

@@ -258,8 +258,9 @@ xq_status xq_node_xml(const xq_node* node, xq_writing flags, xq_text* xml) {
 xq_status xq_node_write(const xq_node* node, xq_writing flags, xq_write write, void* data) {
   if (!areGood(node) || !areWritingFlags(flags) || !write) return XQ_USAGE;
   return guarded([&] {
+    const Ref<NSXMLNode> kept = node->node;  // the callback may move or free the handle
     bool hasFailed = false;
-    writeNode(*node->node, flags, [&](std::string_view piece) {
+    writeNode(*kept, flags, [&](std::string_view piece) {
       hasFailed = hasFailed || write(data, piece.data(), piece.size()) != 0;
       return !hasFailed;
     });

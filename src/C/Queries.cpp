@@ -35,9 +35,10 @@ xq_status xq_compile(const char* text, size_t length, const xq_options* options,
   if (!source.isGood() || (options && !areGood(options))) return XQ_USAGE;
   return guarded([&] {
     const XQueryWay way = options ? options->way : XQueryWay::Planned;
-    const auto compiled =
-        XQuery::xqueryWithSource(source.view(), options ? options->loading : XQueryLoading(),
-                                 options ? options->limits : XQueryLimits(), way);
+    // Copies: the loader may change the options, or free them.
+    const XQueryLoading loading = options ? options->loading : XQueryLoading();
+    const XQueryLimits limits = options ? options->limits : XQueryLimits();
+    const auto compiled = XQuery::xqueryWithSource(source.view(), loading, limits, way);
     if (const auto errors = compiled->parseErrors()) return giveErrors(error, errors);
     return giveNew(query, compiled, way);
   });

@@ -64,6 +64,27 @@ static void a_deep_recursion_ends_in_an_error(void) {
   CHECK_OK(xq_query_free(query));
 }
 
+static int trace_and_free(void* data, const xq_value* value, const char* label, size_t length) {
+  xq_query** query = (xq_query**)data;
+  (void)value, (void)label, (void)length;
+  CHECK_OK(xq_query_free(*query));
+  *query = NULL;
+  return 0;
+}
+
+static void a_callback_may_free_the_query(void) {
+  xq_query* query = compiled("for $i in trace((1, 2), 'l') return concat('a', $i)");
+  xq_context* context = NULL;
+  xq_value* items = NULL;
+  CHECK_OK(xq_context_new(&context));
+  CHECK_OK(xq_context_set_trace(context, trace_and_free, &query, NULL));
+  CHECK_OK(xq_evaluate(context, query, &items, NULL));
+  CHECK(query == NULL);
+  check_items(items, "a1 a2");
+  CHECK_OK(xq_value_free(items));
+  CHECK_OK(xq_context_free(context));
+}
+
 static void wrong_uses_have_a_status(void) {
   xq_query* query = compiled("1");
   xq_context* context = NULL;
@@ -85,6 +106,7 @@ const test_case evaluation_tests[] = {
     {"results outlive query and context", results_outlive_query_and_context},
     {"results may be changed", results_may_be_changed},
     {"a deep recursion ends in an error", a_deep_recursion_ends_in_an_error},
+    {"a callback may free the query", a_callback_may_free_the_query},
     {"wrong uses have a status", wrong_uses_have_a_status},
     TEST_END,
 };

@@ -256,6 +256,24 @@ static void nodes_are_written_as_xml(void) {
   CHECK_OK(xq_node_free(node));
 }
 
+static int write_and_free(void* data, const char* bytes, size_t length) {
+  xq_node** node = (xq_node**)data;
+  (void)bytes, (void)length;
+  CHECK_OK(xq_node_free(*node));
+  *node = NULL;
+  return 0;
+}
+
+static void a_writer_may_free_the_node(void) {
+  char xml[20000] = "<a>";
+  xq_node* node;
+  while (strlen(xml) + 60 < sizeof(xml)) strcat(xml, "<b>some text that has to be written</b>");
+  strcat(xml, "</a>");
+  node = document_of(xml);
+  CHECK_OK(xq_node_write(node, XQ_WRITE_XML, write_and_free, &node));
+  CHECK(node == NULL);
+}
+
 static void a_failing_writer_gives_a_status(void) {
   xq_node* node = document_of(sample);
   sink to = {"", 0, 1, 0};
@@ -278,6 +296,7 @@ const test_case nodes_tests[] = {
     {"nodes keep their document", nodes_keep_their_document},
     {"order is that of the document", order_is_that_of_the_document},
     {"nodes are written as XML", nodes_are_written_as_xml},
+    {"a writer may free the node", a_writer_may_free_the_node},
     {"a failing writer gives a status", a_failing_writer_gives_a_status},
     TEST_END,
 };

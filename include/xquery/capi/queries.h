@@ -23,7 +23,8 @@ typedef struct xq_query xq_query;
  * UTF-8 included; XQ_HOST where the host's loader fails. */
 XQUERY_EXPORT xq_status xq_compile(const char* text, size_t length, const xq_options* options,
                                    xq_query** query, xq_error** error);
-/* Null is let pass. Evaluations that other threads have begun must have ended. */
+/* Null is let pass. A callback may free the query that it is called for; evaluations that other
+ * threads have begun must have ended. */
 XQUERY_EXPORT xq_status xq_query_free(xq_query* query);
 
 typedef int xq_plan_format;
