@@ -109,7 +109,7 @@ xq_status xq_error_number(const xq_error* error, int64_t* number) {
 }
 
 xq_status xq_error_category(const xq_error* error, xq_category* category) {
-  return readError(error, category, xq_category{XQ_CATEGORY_INTERNAL}, [&] {
+  return readError(error, category, xq_category{0}, [&] {
     *category = error->category;
     return XQ_OK;
   });

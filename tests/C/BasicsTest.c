@@ -86,6 +86,7 @@ static void null_handles_are_wrong_use(void) {
   CHECK_STATUS(xq_error_number(NULL, &number), XQ_USAGE);
   CHECK_NUMBER(number, 0);
   CHECK_STATUS(xq_error_category(NULL, &flag), XQ_USAGE);
+  CHECK_NUMBER(flag, 0);
   CHECK_STATUS(xq_error_message(NULL, &string), XQ_USAGE);
   CHECK_TEXT(string, "");
   CHECK_STATUS(xq_error_description(NULL, &string), XQ_USAGE);
