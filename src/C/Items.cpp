@@ -3,12 +3,8 @@
 #include "C/Texts.h"
 #include "C/Values.h"
 #include "Types/XQueryBinary.h"
-#include "Types/XQueryDate.h"
-#include "Types/XQueryDuration.h"
-#include "Types/XQueryNumber.h"
-#include "Types/XQueryQName.h"
-#include "Types/XQueryTypeTable.h"
 #include "xquery/Data.h"
+#include "xquery/Values.h"
 #include "xquery/XQuery.h"
 
 #include <cmath>
@@ -39,7 +35,7 @@ template <class Read>
 xq_status readItem(const xq_value* value, size_t at, Read read) {
   if (!areGood(value)) return XQ_USAGE;
   if (at >= value->items.size()) return XQ_END;
-  return guarded([&]() -> xq_status { return read(*value->items[at]); });
+  return guarded([&]() -> xq_status { return read(value->items[at]); });
 }
 
 // The same for what goes into a variable of the host's, which is `otherwise` at first.
@@ -56,53 +52,56 @@ xq_status readItemTo(xq_text* out, const xq_value* value, size_t at, Read read) 
   return readItem(value, at, read);
 }
 
-// Whether the item is an integer, of whatever type, and then which.
-bool isInteger(const NSObject& item, NSDecimal& integer) {
-  if (!XQueryIsKindOfType(XQueryObjectTypeID(&item), XQueryTypeInteger)) return false;
-  integer = cast<NSNumber>(&item)->decimalValue();
-  return integer.isInteger();
+// The same for what one of the engine's readers answers, which do not convert; its error is a
+// mismatch.
+template <class Out, class Found>
+xq_status readItemBy(XQueryResult<Found> (*reader)(const Value&), const xq_value* value, size_t at,
+                     Out* out) {
+  return readItemTo(out, Out{}, value, at, [&](const Value& item) {
+    const XQueryResult<Found> found = reader(item);
+    if (!found) return XQ_MISMATCH;
+    *out = *found;
+    return XQ_OK;
+  });
 }
 
-static_assert(XQ_TYPE_UNTYPED_ATOMIC == static_cast<int>(XQueryTypeUntypedAtomic));
-static_assert(XQ_TYPE_QNAME == static_cast<int>(XQueryTypeQName));
-static_assert(XQ_TYPE_TIME == static_cast<int>(XQueryTypeTime));
-static_assert(XQ_TYPE_DAY_TIME_DURATION == static_cast<int>(XQueryTypeDayTimeDuration));
-static_assert(XQ_TYPE_NMTOKEN == static_cast<int>(XQueryTypeNMTOKEN));
-static_assert(XQ_TYPE_INTEGER == static_cast<int>(XQueryTypeInteger));
-static_assert(XQ_TYPE_UNSIGNED_BYTE == static_cast<int>(XQueryTypeUnsignedByte));
+static_assert(XQ_TYPE_OTHER == static_cast<int>(XQueryItemType::None));
+static_assert(XQ_TYPE_UNTYPED_ATOMIC == static_cast<int>(XQueryItemType::UntypedAtomic));
+static_assert(XQ_TYPE_QNAME == static_cast<int>(XQueryItemType::QName));
+static_assert(XQ_TYPE_TIME == static_cast<int>(XQueryItemType::Time));
+static_assert(XQ_TYPE_DAY_TIME_DURATION == static_cast<int>(XQueryItemType::DayTimeDuration));
+static_assert(XQ_TYPE_NMTOKEN == static_cast<int>(XQueryItemType::NMTOKEN));
+static_assert(XQ_TYPE_INTEGER == static_cast<int>(XQueryItemType::Integer));
+static_assert(XQ_TYPE_UNSIGNED_BYTE == static_cast<int>(XQueryItemType::UnsignedByte));
 
 }  // namespace
 
 // --- what an item is -----------------------------------------------------------------------------
 
 xq_status xq_value_type(const xq_value* value, size_t at, xq_type* type) {
-  return readItemTo(type, xq_type{XQ_TYPE_OTHER}, value, at, [&](const NSObject& item) {
-    const XQueryTypeID found = XQueryObjectTypeID(&item);
-    if (item.isNode()) {
-      *type = XQ_TYPE_NODE;
-    } else if (found >= XQueryTypeUntypedAtomic) {
-      *type = static_cast<xq_type>(found);
-    }
+  return readItemTo(type, xq_type{XQ_TYPE_OTHER}, value, at, [&](const Value& item) {
+    const XQueryItemType found = XQueryTypeOfItem(*item);
+    *type = XQueryIsNodeType(found) ? XQ_TYPE_NODE : static_cast<xq_type>(found);
     return XQ_OK;
   });
 }
 
 xq_status xq_value_type_name(const xq_value* value, size_t at, xq_text* name) {
   return readItemTo(name, value, at,
-                    [&](const NSObject& item) { return fill(*name, XQueryItemTypeName(item)); });
+                    [&](const Value& item) { return fill(*name, XQueryItemTypeName(*item)); });
 }
 
 xq_status xq_value_string(const xq_value* value, size_t at, xq_text* text) {
-  return readItemTo(text, value, at, [&](const NSObject& item) {
-    if (const auto* string = dyn_cast<NSString>(&item)) return fill(*text, string->view());
-    return fill(*text, XQueryItemStringValue(item));
+  return readItemTo(text, value, at, [&](const Value& item) {
+    if (const auto* string = dyn_cast<NSString>(item)) return fill(*text, string->view());
+    return fill(*text, XQueryItemStringValue(*item));
   });
 }
 
 xq_status xq_value_xml(const xq_value* value, size_t at, xq_text* xml) {
-  return readItemTo(xml, value, at, [&](const NSObject& item) {
-    const auto* node = dyn_cast<NSXMLNode>(&item);
-    if (!node) return fill(*xml, XQueryItemStringValue(item));
+  return readItemTo(xml, value, at, [&](const Value& item) {
+    const auto* node = dyn_cast<NSXMLNode>(item);
+    if (!node) return fill(*xml, XQueryItemStringValue(*item));
     std::string text;
     node->appendXMLTo(text);
     return fill(*xml, text);
@@ -112,39 +111,19 @@ xq_status xq_value_xml(const xq_value* value, size_t at, xq_text* xml) {
 // --- atomic values -------------------------------------------------------------------------------
 
 xq_status xq_value_integer(const xq_value* value, size_t at, int64_t* integer) {
-  return readItemTo(integer, int64_t{0}, value, at, [&](const NSObject& item) {
-    NSDecimal number;
-    if (!isInteger(item, number) || !number.isSmallInteger()) return XQ_MISMATCH;
-    *integer = number.smallInteger();
-    return XQ_OK;
-  });
+  return readItemBy(XQueryReadInteger, value, at, integer);
 }
 
 xq_status xq_value_unsigned(const xq_value* value, size_t at, uint64_t* integer) {
-  return readItemTo(integer, uint64_t{0}, value, at, [&](const NSObject& item) {
-    NSDecimal number;
-    if (!isInteger(item, number) || number.sign() < 0) return XQ_MISMATCH;
-    if (number.compare(NSDecimal::fromUnsigned(UINT64_MAX)) > 0) return XQ_MISMATCH;
-    *integer = number.uint64Value();
-    return XQ_OK;
-  });
+  return readItemBy(XQueryReadUnsignedInteger, value, at, integer);
 }
 
 xq_status xq_value_double(const xq_value* value, size_t at, double* number) {
-  return readItemTo(number, 0.0, value, at, [&](const NSObject& item) {
-    if (!XQueryIsNumericTypeID(XQueryObjectTypeID(&item))) return XQ_MISMATCH;
-    *number = cast<NSNumber>(&item)->doubleValue();
-    return XQ_OK;
-  });
+  return readItemBy(XQueryReadDouble, value, at, number);
 }
 
 xq_status xq_value_boolean(const xq_value* value, size_t at, int* boolean) {
-  return readItemTo(boolean, 0, value, at, [&](const NSObject& item) {
-    const auto* number = dyn_cast<NSNumber>(&item);
-    if (!number || !number->isBoolean()) return XQ_MISMATCH;
-    *boolean = number->boolValue();
-    return XQ_OK;
-  });
+  return readItemBy(XQueryReadBoolean, value, at, boolean);
 }
 
 xq_status xq_value_qname(const xq_value* value, size_t at, xq_text* uri, xq_text* local_name,
@@ -152,15 +131,12 @@ xq_status xq_value_qname(const xq_value* value, size_t at, xq_text* uri, xq_text
   bool isUsable = uri != local_name && uri != prefix && local_name != prefix;
   for (xq_text* text : {uri, local_name, prefix}) isUsable = emptied(text) && isUsable;
   if (!isUsable) return XQ_USAGE;
-  const auto fillAny = [](xq_text& text, const Ref<NSString>& string) {
-    if (string) fill(text, string);
-  };
-  const xq_status status = readItem(value, at, [&](const NSObject& item) {
-    const auto* name = dyn_cast<XQueryQName>(&item);
+  const xq_status status = readItem(value, at, [&](const Value& item) {
+    const auto name = XQueryReadQName(item);
     if (!name) return XQ_MISMATCH;
-    fillAny(*uri, name->namespaceURI());
-    fillAny(*local_name, name->localPart());
-    fillAny(*prefix, name->prefixHint());
+    fill(*uri, name->namespaceURI);
+    fill(*local_name, name->localName);
+    fill(*prefix, name->prefix);
     return XQ_OK;
   });
   if (status != XQ_OK) {
@@ -169,49 +145,31 @@ xq_status xq_value_qname(const xq_value* value, size_t at, xq_text* uri, xq_text
   return status;
 }
 
+// Not by the reader, which would copy the bytes once more.
 xq_status xq_value_bytes(const xq_value* value, size_t at, xq_text* bytes) {
-  return readItemTo(bytes, value, at, [&](const NSObject& item) -> xq_status {
-    if (const auto* data = dyn_cast<NSData>(&item)) return fill(*bytes, data->bytes());
-    const auto* binary = dyn_cast<XQueryBinary>(&item);
+  return readItemTo(bytes, value, at, [&](const Value& item) -> xq_status {
+    if (const auto* data = dyn_cast<NSData>(item)) return fill(*bytes, data->bytes());
+    const auto* binary = dyn_cast<XQueryBinary>(item);
     return binary ? fill(*bytes, binary->data()->bytes()) : XQ_MISMATCH;
   });
 }
 
-namespace {
-
-// The fields at rest, which the type does not have, are nobody's.
-void clearFields(xq_date_time& fields, XQueryTypeID type) {
-  const bool hasTime = type == XQueryTypeDateTime || type == XQueryTypeTime;
-  const bool hasDate = type == XQueryTypeDateTime || type == XQueryTypeDate;
-  if (!hasTime) fields.hour = fields.minute = fields.second = fields.nanosecond = 0;
-  if (!hasDate && type != XQueryTypeGYearMonth && type != XQueryTypeGYear) fields.year = 0;
-  if (!hasDate && type != XQueryTypeGYearMonth && type != XQueryTypeGMonthDay &&
-      type != XQueryTypeGMonth) {
-    fields.month = 0;
-  }
-  if (!hasDate && type != XQueryTypeGMonthDay && type != XQueryTypeGDay) fields.day = 0;
-}
-
-}  // namespace
-
 xq_status xq_value_date_time(const xq_value* value, size_t at, xq_date_time* fields) {
-  return readItemTo(fields, xq_date_time{}, value, at, [&](const NSObject& item) {
-    const auto* date = dyn_cast<XQueryDate>(&item);
-    if (!date) return XQ_MISMATCH;
-    const NSGregorianDate shown = date->gregorianDate();
-    *fields = {shown.year,
-               shown.month,
-               shown.day,
-               shown.hour,
-               shown.minute,
-               static_cast<int32_t>(shown.second),
-               date->instant().nanoseconds,
+  return readItemTo(fields, xq_date_time{}, value, at, [&](const Value& item) {
+    const auto parts = XQueryReadDateTimeParts(item);
+    if (!parts) return XQ_MISMATCH;
+    *fields = {parts->year,
+               parts->month,
+               parts->day,
+               parts->hour,
+               parts->minute,
+               parts->second,
+               parts->nanosecond,
                0,
                0};
-    clearFields(*fields, date->typeID());
-    if (date->timeZone()) {
+    if (parts->zone) {
       fields->has_zone = 1;
-      fields->zone_seconds = date->timeZone()->secondsFromGMT(date->instant());
+      fields->zone_seconds = static_cast<int32_t>(parts->zone->count() * 60);
     }
     return XQ_OK;
   });
@@ -219,47 +177,51 @@ xq_status xq_value_date_time(const xq_value* value, size_t at, xq_date_time* fie
 
 namespace {
 
-xq_duration durationOfSeconds(double seconds) {
-  const double magnitude = std::fabs(seconds);
-  const double whole = std::floor(magnitude);
-  xq_duration duration = {seconds < 0, 0, static_cast<int64_t>(whole),
-                          static_cast<int32_t>(std::llround((magnitude - whole) * 1e9))};
+// Adds seconds to a duration; false where they are more than it holds.
+bool addSeconds(xq_duration& duration, double seconds) {
+  constexpr double mostSeconds = 9e18;  // leaves room for the days of 32 bits
+  if (!(seconds < mostSeconds)) return false;
+  const double whole = std::floor(seconds);
+  duration.seconds += static_cast<int64_t>(whole);
+  duration.nanoseconds = static_cast<int32_t>(std::llround((seconds - whole) * 1e9));
   if (duration.nanoseconds == 1000000000) {
     ++duration.seconds;
     duration.nanoseconds = 0;
   }
-  return duration;
+  return true;
 }
 
-xq_duration durationOf(const XQueryDuration& written) {
-  xq_duration duration = durationOfSeconds(written.second());
-  duration.is_negative = written.isNeg();
-  duration.months = int64_t{written.year()} * 12 + written.month();
-  duration.seconds +=
-      (int64_t{written.day()} * 24 + written.hour()) * 3600 + int64_t{written.minute()} * 60;
-  return duration;
+// Each type by the reader that has all of its range.
+bool readDuration(const Value& item, xq_duration& duration) {
+  const XQueryItemType type = XQueryTypeOfItem(*item);
+  if (type == XQueryItemType::YearMonthDuration) {
+    const int64_t months = XQueryReadYearMonthDuration(item)->count();
+    if (months == INT64_MIN) return false;
+    duration.is_negative = months < 0;
+    duration.months = months < 0 ? -months : months;
+    return true;
+  }
+  if (type == XQueryItemType::DayTimeDuration) {
+    const double seconds = XQueryReadDayTimeDuration(item)->count();
+    duration.is_negative = seconds < 0;
+    return addSeconds(duration, std::fabs(seconds));
+  }
+  const auto parts = XQueryReadDuration(item);
+  if (!parts) return false;
+  duration.is_negative = parts->isNegative;
+  duration.months = int64_t{parts->years} * 12 + parts->months;
+  duration.seconds =
+      (int64_t{parts->days} * 24 + parts->hours) * 3600 + int64_t{parts->minutes} * 60;
+  return addSeconds(duration, parts->seconds);
 }
 
 }  // namespace
 
 xq_status xq_value_duration(const xq_value* value, size_t at, xq_duration* duration) {
-  return readItemTo(duration, xq_duration{}, value, at, [&](const NSObject& item) {
-    constexpr double mostSeconds = 9e18;
-    if (const auto* written = dyn_cast<XQueryDuration>(&item)) {
-      *duration = durationOf(*written);
-      return XQ_OK;
-    }
-    const XQueryTypeID type = XQueryObjectTypeID(&item);
-    if (type == XQueryTypeYearMonthDuration) {
-      const int64_t months = cast<NSNumber>(&item)->longLongValue();
-      if (months == INT64_MIN) return XQ_MISMATCH;
-      *duration = {months < 0, months < 0 ? -months : months, 0, 0};
-      return XQ_OK;
-    }
-    if (type != XQueryTypeDayTimeDuration) return XQ_MISMATCH;
-    const double seconds = cast<NSNumber>(&item)->doubleValue();
-    if (!(std::fabs(seconds) < mostSeconds)) return XQ_MISMATCH;
-    *duration = durationOfSeconds(seconds);
+  return readItemTo(duration, xq_duration{}, value, at, [&](const Value& item) {
+    xq_duration read = {};
+    if (!readDuration(item, read)) return XQ_MISMATCH;
+    *duration = read;
     return XQ_OK;
   });
 }
@@ -268,9 +230,8 @@ xq_status xq_value_duration(const xq_value* value, size_t at, xq_duration* durat
 
 xq_status xq_value_node(const xq_value* value, size_t at, xq_node** node) {
   return readItemTo(node, static_cast<xq_node*>(nullptr), value, at,
-                    [&](const NSObject& item) -> xq_status {
-                      if (!item.isNode()) return XQ_MISMATCH;
-                      const auto& found = *cast<NSXMLNode>(&item);
-                      return giveNew(node, const_cast<NSXMLNode*>(&found));
+                    [&](const Value& item) -> xq_status {
+                      auto* found = dyn_cast<NSXMLNode>(item);
+                      return found ? giveNew(node, found) : XQ_MISMATCH;
                     });
 }

@@ -3,18 +3,11 @@
 
 #include "C/Nodes.h"
 #include "C/Texts.h"
-#include "Types/XQueryBinary.h"
-#include "Types/XQueryCasting.h"
-#include "Types/XQueryDate.h"
-#include "Types/XQueryDuration.h"
 #include "Types/XQueryNumber.h"
-#include "Types/XQueryQName.h"
-#include "Types/XQueryString.h"
-#include "Types/XQueryTypeTable.h"
-#include "xquery/Data.h"
-#include "xquery/XQuery.h"
+#include "xquery/Values.h"
 
-#include <cstdio>
+#include <algorithm>
+#include <limits>
 #include <string>
 
 using namespace xquery;
@@ -66,63 +59,75 @@ xq_status addItem(xq_value* value, Make make) {
   });
 }
 
-// The same of a text that has to be UTF-8.
+// What a maker answers: the value, or null where there is an error.
+Value valueOf(const XQueryResult<Value>& made) {
+  return made ? *made : nullptr;
+}
+
+// Adds what `make` answers, which is a result, of texts; whether they are UTF-8 is asked only where
+// it is an error.
 template <class Make>
-xq_status addText(xq_value* value, const char* text, size_t length, Make make) {
-  const GivenText given(text, length);
-  if (!areGood(value) || value->isLent || !given.isGood()) return XQ_USAGE;
+xq_status addOfTexts(xq_value* value, std::initializer_list<GivenText> texts, Make make) {
+  if (!areGood(value) || value->isLent) return XQ_USAGE;
+  for (const GivenText& text : texts) {
+    if (!text.isGood()) return XQ_USAGE;
+  }
+  const xq_status status = addItem(value, [&] { return valueOf(make()); });
+  if (status != XQ_MISMATCH) return status;
   return guarded([&]() -> xq_status {
-    const Ref<NSString> string = given.string();
-    return string ? addItem(value, [&] { return make(*string); }) : XQ_INPUT;
+    const bool isUTF8 = std::all_of(texts.begin(), texts.end(),
+                                    [](const GivenText& text) { return text.string() != nullptr; });
+    return isUTF8 ? XQ_MISMATCH : XQ_INPUT;
   });
 }
 
 }  // namespace
 
 xq_status xq_value_add_integer(xq_value* value, int64_t integer) {
-  return addItem(value, [&] { return XQueryNumber::integerWithInt64(integer); });
+  return addItem(value, [&] { return XQueryMakeSignedInteger(integer); });
 }
 
 xq_status xq_value_add_unsigned(xq_value* value, uint64_t integer) {
-  return addItem(
-      value, [&] { return XQueryNumber::integerWithDecimal(NSDecimal::fromUnsigned(integer)); });
+  return addItem(value, [&] { return XQueryMakeUnsignedInteger(integer); });
 }
 
 xq_status xq_value_add_double(xq_value* value, double number) {
-  return addItem(value, [&] { return XQueryNumber::numberWithDouble(number); });
+  return addItem(value, [&] { return XQueryMakeDouble(number); });
 }
 
+// Of type xs:float even where it is NaN or an infinity.
 xq_status xq_value_add_float(xq_value* value, float number) {
   return addItem(value,
                  [&] { return XQueryNumber::floatWithNumber(*NSNumber::numberWithFloat(number)); });
 }
 
 xq_status xq_value_add_boolean(xq_value* value, int boolean) {
-  return addItem(value, [&] { return NSNumber::numberWithBool(boolean != 0); });
+  return addItem(value, [&] { return XQueryMakeBoolean(boolean != 0); });
 }
 
 xq_status xq_value_add_string(xq_value* value, const char* text, size_t length) {
-  return addText(value, text, length,
-                 [](const NSString& string) { return XQueryString::stringWithString(string); });
+  const GivenText given(text, length);
+  return addOfTexts(value, {given}, [&] { return XQueryMakeString(given.view()); });
 }
 
 xq_status xq_value_add_untyped(xq_value* value, const char* text, size_t length) {
-  return addText(value, text, length,
-                 [](const NSString& string) { return Value(const_cast<NSString*>(&string)); });
+  const GivenText given(text, length);
+  return addOfTexts(value, {given}, [&] { return XQueryMakeUntypedAtomic(given.view()); });
 }
 
 namespace {
 
-// The types that a text can be cast to, without context.
+// The types that a text alone makes an item of.
 bool isMadeOfText(xq_type type) {
-  switch (type) {
-    case XQ_TYPE_QNAME:
-    case XQueryTypeIDREFS:
-    case XQueryTypeENTITIES:
-    case XQueryTypeNMTOKENS:
+  if (type < XQ_TYPE_UNTYPED_ATOMIC || type > XQ_TYPE_UNSIGNED_BYTE) return false;
+  switch (static_cast<XQueryItemType>(type)) {
+    case XQueryItemType::QName:
+    case XQueryItemType::IDREFS:
+    case XQueryItemType::ENTITIES:
+    case XQueryItemType::NMTOKENS:
       return false;
     default:
-      return type >= XQ_TYPE_UNTYPED_ATOMIC && type <= XQ_TYPE_UNSIGNED_BYTE;
+      return true;
   }
 }
 
@@ -130,55 +135,30 @@ bool isMadeOfText(xq_type type) {
 
 xq_status xq_value_add_text(xq_value* value, xq_type type, const char* text, size_t length) {
   if (!isMadeOfText(type)) return XQ_USAGE;
-  return addText(value, text, length, [&](const NSString& string) {
-    const Value untyped(const_cast<NSString*>(&string));
-    return XQueryCastAs(untyped, type, *XQueryContext::xqueryContext());
+  const GivenText given(text, length);
+  return addOfTexts(value, {given}, [&] {
+    return XQueryMakeFromText(static_cast<XQueryItemType>(type), given.view());
   });
 }
-
-namespace {
-
-Value qNameOf(const NSString& URI, const NSString& local, const NSString& prefix) {
-  const bool hasPrefix = prefix.length() != 0;
-  if (!XQueryString::isNCName(local.view())) return nullptr;
-  if (hasPrefix && !XQueryString::isNCName(prefix.view())) return nullptr;
-  const Ref<NSString> namespaceURI(URI.length() ? const_cast<NSString*>(&URI) : nullptr);
-  NSMutableString name;
-  if (hasPrefix) {
-    name.append(prefix.view());
-    name.append(u':');
-  }
-  name.append(local.view());
-  return hasPrefix ? XQueryQName::qname(name.string(), namespaceURI)
-                   : XQueryQName::qnameWithLocalPart(name.string(), namespaceURI);
-}
-
-}  // namespace
 
 xq_status xq_value_add_qname(xq_value* value, const char* uri, size_t uri_length,
                              const char* local_name, size_t local_name_length, const char* prefix,
                              size_t prefix_length) {
-  const GivenText givenURI(uri, uri_length);
-  const GivenText givenLocal(local_name, local_name_length);
-  const GivenText givenPrefix(prefix, prefix_length);
-  if (!areGood(value) || value->isLent) return XQ_USAGE;
-  if (!givenURI.isGood() || !givenLocal.isGood() || !givenPrefix.isGood()) return XQ_USAGE;
-  return guarded([&]() -> xq_status {
-    const Ref<NSString> URI = givenURI.string();
-    const Ref<NSString> local = givenLocal.string();
-    const Ref<NSString> hint = givenPrefix.string();
-    if (!URI || !local || !hint) return XQ_INPUT;
-    return addItem(value, [&] { return qNameOf(*URI, *local, *hint); });
+  const GivenText URI(uri, uri_length);
+  const GivenText local(local_name, local_name_length);
+  const GivenText hint(prefix, prefix_length);
+  return addOfTexts(value, {URI, local, hint}, [&] {
+    return XQueryMakeQName(
+        {std::string(URI.view()), std::string(local.view()), std::string(hint.view())});
   });
 }
 
 xq_status xq_value_add_bytes(xq_value* value, xq_type type, const char* bytes, size_t length) {
   if (type != XQ_TYPE_HEX_BINARY && type != XQ_TYPE_BASE64_BINARY) return XQ_USAGE;
   if (length == XQ_NUL || (!bytes && length != 0)) return XQ_USAGE;
-  return addItem(value, [&]() -> Value {
-    const auto data = NSData::dataWithBytes(bytes ? std::string(bytes, length) : std::string());
-    if (type == XQ_TYPE_HEX_BINARY) return XQueryHexBinary::binaryWithData(data);
-    return XQueryBase64Binary::binaryWithData(data);
+  const std::string_view given(bytes ? bytes : "", length);
+  return addItem(value, [&] {
+    return type == XQ_TYPE_HEX_BINARY ? XQueryMakeHexBinary(given) : XQueryMakeBase64Binary(given);
   });
 }
 
@@ -186,137 +166,46 @@ xq_status xq_value_add_bytes(xq_value* value, xq_type type, const char* bytes, s
 
 namespace {
 
-// Dates are made from their text, by the parser that a query would use, which checks every field.
-struct DateTimeParts {
-  bool hasYear, hasMonth, hasDay, hasTime;
-  const char* beforeMonth;
-  const char* beforeDay;
-  const char* atEnd;
-  Ref<XQueryDate> (*read)(NSStringView text);
-};
-
-// Null for a type that is none of dates and times.
-const DateTimeParts* partsOf(xq_type type) {
-  static const DateTimeParts dateTime = {true, true, true, true,
-                                         "-",  "-",  "",   XQueryDate::xqueryDateTimeFromString};
-  static const DateTimeParts date = {true, true, true, false,
-                                     "-",  "-",  "",   XQueryDate::xqueryDateFromString};
-  static const DateTimeParts time = {false, false, false, true,
-                                     "",    "",    "",    XQueryDate::xqueryTimeFromString};
-  static const DateTimeParts yearMonth = {
-      true, true, false, false, "-", "", "", XQueryDate::xqueryGMonthYearFromString};
-  static const DateTimeParts year = {true, false, false, false,
-                                     "",   "",    "",    XQueryDate::xqueryGYearFromString};
-  static const DateTimeParts monthDay = {false, true, true, false,
-                                         "--",  "-",  "",   XQueryDate::xqueryGMonthDayFromString};
-  static const DateTimeParts day = {false, false, true, false,
-                                    "",    "---", "",   XQueryDate::xqueryGDayFromString};
-  static const DateTimeParts month = {false, true, false, false,
-                                      "--",  "",   "--",  XQueryDate::xqueryGMonthFromString};
-  switch (type) {
-    case XQ_TYPE_DATE_TIME:
-      return &dateTime;
-    case XQ_TYPE_DATE:
-      return &date;
-    case XQ_TYPE_TIME:
-      return &time;
-    case XQ_TYPE_G_YEAR_MONTH:
-      return &yearMonth;
-    case XQ_TYPE_G_YEAR:
-      return &year;
-    case XQ_TYPE_G_MONTH_DAY:
-      return &monthDay;
-    case XQ_TYPE_G_DAY:
-      return &day;
-    case XQ_TYPE_G_MONTH:
-      return &month;
-    default:
-      return nullptr;
-  }
-}
-
-std::string digits(int64_t value, int width) {
-  std::string text = std::to_string(value);
-  if (text.size() < static_cast<size_t>(width)) text.insert(0, width - text.size(), '0');
-  return text;
-}
-
-// What is out of its range becomes text that is no date.
-std::string yearText(int64_t year) {
-  return year < 0 ? "-" + digits(-year, 4) : digits(year, 4);
-}
-
-std::string timeText(const xq_date_time& fields) {
-  std::string text =
-      digits(fields.hour, 2) + ":" + digits(fields.minute, 2) + ":" + digits(fields.second, 2);
-  if (fields.nanosecond != 0) text += "." + digits(fields.nanosecond, 9);
-  return text;
-}
-
-std::string zoneText(int32_t seconds) {
-  if (seconds == 0) return "Z";
-  const int64_t minutes = (seconds < 0 ? -int64_t{seconds} : int64_t{seconds}) / 60;
-  return (seconds < 0 ? "-" : "+") + digits(minutes / 60, 2) + ":" + digits(minutes % 60, 2);
-}
-
-bool isZone(int32_t seconds) {
-  constexpr int32_t mostSeconds = 14 * 3600;
-  return seconds % 60 == 0 && seconds >= -mostSeconds && seconds <= mostSeconds;
-}
-
-Value dateTimeOf(const DateTimeParts& parts, const xq_date_time& fields) {
-  if (parts.hasTime && (fields.nanosecond < 0 || fields.nanosecond > 999999999)) return nullptr;
-  if (parts.hasTime && fields.second > 59) return nullptr;
-  if (fields.has_zone && !isZone(fields.zone_seconds)) return nullptr;
-  std::string text;
-  if (parts.hasYear) text += yearText(fields.year);
-  if (parts.hasMonth) text += parts.beforeMonth + digits(fields.month, 2);
-  if (parts.hasDay) text += parts.beforeDay + digits(fields.day, 2);
-  if (parts.hasTime && parts.hasDay) text += "T";
-  if (parts.hasTime) text += timeText(fields);
-  text += parts.atEnd;
-  if (fields.has_zone) text += zoneText(fields.zone_seconds);
-  return parts.read(NSStringView::ascii(text));
+XQueryResult<Value> dateTimeOf(XQueryItemType type, const xq_date_time& fields) {
+  XQueryDateTimeParts parts = {fields.year,   fields.month,  fields.day,        fields.hour,
+                               fields.minute, fields.second, fields.nanosecond, std::nullopt};
+  if (fields.has_zone) parts.zone = std::chrono::minutes(fields.zone_seconds / 60);
+  return XQueryMakeDateOfType(type, parts);
 }
 
 constexpr int64_t secondsPerDay = 86400;
 
-std::string durationText(const xq_duration& duration) {
-  char text[160];
-  const int64_t seconds = duration.seconds;
-  std::snprintf(text, sizeof(text), "%sP%lldY%lldM%lldDT%lldH%lldM%lld.%09dS",
-                duration.is_negative ? "-" : "", static_cast<long long>(duration.months / 12),
-                static_cast<long long>(duration.months % 12),
-                static_cast<long long>(seconds / secondsPerDay),
-                static_cast<long long>(seconds % secondsPerDay / 3600),
-                static_cast<long long>(seconds % 3600 / 60), static_cast<long long>(seconds % 60),
-                duration.nanoseconds);
-  return text;
-}
-
 Value durationOf(xq_type type, const xq_duration& duration) {
+  constexpr int64_t mostField = std::numeric_limits<int32_t>::max();
   constexpr int64_t mostExact = int64_t{1} << 53;  // seconds are a double
-  if (duration.months < 0 || duration.seconds < 0) return nullptr;
-  if (duration.nanoseconds < 0 || duration.nanoseconds > 999999999) return nullptr;
+  const auto& [isNegative, months, seconds, nanoseconds] = duration;
+  if (months < 0 || seconds < 0 || nanoseconds < 0 || nanoseconds > 999999999) return nullptr;
+  const double fraction = nanoseconds / 1e9;
   if (type == XQ_TYPE_DURATION) {
-    return XQueryDuration::durationWithString(NSStringView::ascii(durationText(duration)));
+    if (months / 12 > mostField || seconds / secondsPerDay > mostField) return nullptr;
+    const auto field = [](int64_t value) { return static_cast<int32_t>(value); };
+    return valueOf(XQueryMakeDuration(
+        {isNegative != 0, field(months / 12), field(months % 12), field(seconds / secondsPerDay),
+         field(seconds % secondsPerDay / 3600), field(seconds % 3600 / 60),
+         static_cast<double>(seconds % 60) + fraction}));
   }
   if (type == XQ_TYPE_YEAR_MONTH_DURATION) {
-    if (duration.seconds != 0 || duration.nanoseconds != 0) return nullptr;
-    return XQueryNumber::yearMonthDurationWithMonths(duration.is_negative ? -duration.months
-                                                                          : duration.months);
+    if (seconds != 0 || nanoseconds != 0) return nullptr;
+    return XQueryMakeYearMonthDuration(std::chrono::months(isNegative ? -months : months));
   }
-  if (duration.months != 0 || duration.seconds > mostExact) return nullptr;
-  const double seconds = static_cast<double>(duration.seconds) + duration.nanoseconds / 1e9;
-  return XQueryNumber::dayTimeDurationWithSeconds(duration.is_negative ? -seconds : seconds);
+  if (months != 0 || seconds > mostExact) return nullptr;
+  const double all = static_cast<double>(seconds) + fraction;
+  return valueOf(XQueryMakeDayTimeDuration(std::chrono::duration<double>(isNegative ? -all : all)));
 }
 
 }  // namespace
 
 xq_status xq_value_add_date_time(xq_value* value, xq_type type, const xq_date_time* fields) {
-  const DateTimeParts* parts = partsOf(type);
-  if (!parts || !fields) return XQ_USAGE;
-  return addItem(value, [&] { return dateTimeOf(*parts, *fields); });
+  if (type < XQ_TYPE_G_YEAR_MONTH || type > XQ_TYPE_TIME || !fields) return XQ_USAGE;
+  return addItem(value, [&]() -> Value {
+    if (fields->has_zone && fields->zone_seconds % 60 != 0) return nullptr;
+    return valueOf(dateTimeOf(static_cast<XQueryItemType>(type), *fields));
+  });
 }
 
 xq_status xq_value_add_duration(xq_value* value, xq_type type, const xq_duration* duration) {
@@ -338,11 +227,13 @@ xq_status xq_value_add_node(xq_value* value, const xq_node* node) {
 xq_status xq_value_add_all(xq_value* value, const xq_value* other) {
   if (!areGood(value, other) || value->isLent) return XQ_USAGE;
   return guarded([&] {
-    std::vector<Value> items;
-    items.reserve(value->items.size() + other->items.size());
-    items.insert(items.end(), value->items.begin(), value->items.end());
-    items.insert(items.end(), other->items.begin(), other->items.end());
-    value->items = std::move(items);
+    std::vector<Value>& items = value->items;
+    const size_t count = other->items.size();
+    if (items.capacity() - items.size() < count) {
+      items.reserve(std::max(items.size() + count, 2 * items.size()));
+    }
+    // From here on nothing fails, and nothing moves, which matters where both are the same.
+    for (size_t i = 0; i < count; ++i) items.push_back(other->items[i]);
     return XQ_OK;
   });
 }

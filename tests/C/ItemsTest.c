@@ -168,6 +168,22 @@ static void dates_of_queries_have_fields(void) {
   CHECK_OK(xq_value_free(items));
 }
 
+static void durations_beyond_64_bits_of_seconds_are_a_mismatch(void) {
+  static const char beyond[] = "PT99999999999999999999S";
+  xq_value* items = NULL;
+  xq_duration duration = {1, 1, 1, 1};
+  CHECK_OK(xq_value_new(&items));
+  CHECK_OK(xq_value_add_text(items, XQ_TYPE_DURATION, beyond, XQ_NUL));
+  CHECK_OK(xq_value_add_text(items, XQ_TYPE_DAY_TIME_DURATION, beyond, XQ_NUL));
+  CHECK_OK(xq_value_add_text(items, XQ_TYPE_DURATION, "P1Y1DT0.5S", XQ_NUL));
+  CHECK_STATUS(xq_value_duration(items, 0, &duration), XQ_MISMATCH);
+  CHECK_NUMBER(duration.seconds, 0);
+  CHECK_STATUS(xq_value_duration(items, 1, &duration), XQ_MISMATCH);
+  CHECK_OK(xq_value_duration(items, 2, &duration));
+  CHECK(duration.months == 12 && duration.seconds == 86400 && duration.nanoseconds == 500000000);
+  CHECK_OK(xq_value_free(items));
+}
+
 static void raw_data_has_bytes_and_no_type(void) {
   xq_value* items = result_of("xs:hexBinary('00ff')");
   xq_text bytes = XQ_TEXT_INIT;
@@ -196,6 +212,7 @@ const test_case items_tests[] = {
     {"integers that do not fit are a mismatch", integers_that_do_not_fit_are_a_mismatch},
     {"nodes are items", nodes_are_items},
     {"dates of queries have fields", dates_of_queries_have_fields},
+    {"durations beyond 64 bits of seconds", durations_beyond_64_bits_of_seconds_are_a_mismatch},
     {"raw data has bytes and no type", raw_data_has_bytes_and_no_type},
     {"texts beyond ASCII are whole", texts_with_zeros_and_beyond_ascii_are_whole},
     TEST_END,

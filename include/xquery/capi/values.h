@@ -79,7 +79,8 @@ typedef struct xq_date_time {
   int32_t zone_seconds; /* east of GMT is positive; whole minutes, at most 14 hours */
 } xq_date_time;
 
-/* All fields together have the sign. */
+/* All fields together have the sign. An xdt:dayTimeDuration is kept as a double of seconds: exact
+ * to the nanosecond up to 97 days, to the microsecond up to 270 years. */
 typedef struct xq_duration {
   int32_t is_negative;
   int64_t months;
@@ -97,7 +98,8 @@ XQUERY_EXPORT xq_status xq_value_copy(const xq_value* value, xq_value** copy);
 XQUERY_EXPORT xq_status xq_value_free(xq_value* value);
 
 /* Each adds an item at the end. XQ_OK, XQ_USAGE, XQ_MEMORY; where something does not fit
- * XQ_MISMATCH; XQ_INPUT for text that is not UTF-8. */
+ * XQ_MISMATCH, as a character that XML does not have does not fit into any text; XQ_INPUT for text
+ * that is not UTF-8. */
 XQUERY_EXPORT xq_status xq_value_add_integer(xq_value* value, int64_t integer);
 XQUERY_EXPORT xq_status xq_value_add_unsigned(xq_value* value, uint64_t integer);
 XQUERY_EXPORT xq_status xq_value_add_double(xq_value* value, double number);
@@ -107,8 +109,10 @@ XQUERY_EXPORT xq_status xq_value_add_boolean(xq_value* value, int boolean);
 XQUERY_EXPORT xq_status xq_value_add_string(xq_value* value, const char* text, size_t length);
 /* An xdt:untypedAtomic, as the text of a document is: compared with a number it is one. */
 XQUERY_EXPORT xq_status xq_value_add_untyped(xq_value* value, const char* text, size_t length);
-/* A value of any atomic type but QName from its text, by the rules by which a query casts strings:
- * "12.50" to XQ_TYPE_DECIMAL, "2004-10-29" to XQ_TYPE_DATE. XQ_MISMATCH for a text that is none. */
+/* A value of any atomic type but QName from its text, as XML Schema has it: "12.50" for
+ * XQ_TYPE_DECIMAL, "2004-10-29" for XQ_TYPE_DATE. White space is treated as the type has it.
+ * XQ_MISMATCH for a text that is none or out of the range of the type. This is stricter than a cast
+ * in a query, which reads "12abc" as 12. */
 XQUERY_EXPORT xq_status xq_value_add_text(xq_value* value, xq_type type, const char* text,
                                           size_t length);
 /* The URI may be empty, for no namespace. The prefix may be empty and plays no part but in
