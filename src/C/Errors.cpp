@@ -87,6 +87,12 @@ xq_status giveError(xq_error** out, const NSXMLParseError& error) {
   return XQ_INPUT;
 }
 
+xq_status giveOuterLimit(xq_error** out, const NSException& limit) {
+  const std::string reason = limit.reason() ? limit.reason()->utf8() : std::string();
+  return giveError(out, XQueryError::error(XQueryErrorCategory::Limit, 0,
+                                           NSString::stringWithUTF8Replacing(reason)));
+}
+
 }  // namespace xquery::capi
 
 namespace {

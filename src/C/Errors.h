@@ -5,6 +5,7 @@
 #include "xquery/capi/errors.h"
 #include "xquery/Collection.h"
 #include "xquery/Error.h"
+#include "xquery/Exception.h"
 #include "xquery/XMLNode.h"
 
 #include <optional>
@@ -54,5 +55,8 @@ namespace xquery::capi {
 xq_status giveError(xq_error** out, const Ref<NSError>& error);
 xq_status giveErrors(xq_error** out, const Ref<NSArray>& errors);
 xq_status giveError(xq_error** out, const NSXMLParseError& error);
+// Ends an evaluation or a compilation that the host started in a callback of another one. That
+// one's limit was reached, and it will notice as soon as the callback returns.
+xq_status giveOuterLimit(xq_error** out, const NSException& limit);
 
 }  // namespace xquery::capi

@@ -23,14 +23,6 @@ std::vector<Value> itemsOf(const Ref<NSArray>& result) {
   return result->objects();
 }
 
-// Ends an evaluation that the host started in a callback of another one. That one's limit was
-// reached, and it will notice as soon as the callback returns.
-xq_status giveOuterLimit(xq_error** error, const NSException& limit) {
-  const std::string reason = limit.reason() ? limit.reason()->utf8() : std::string();
-  return giveError(error, XQueryError::error(XQueryErrorCategory::Limit, 0,
-                                             NSString::stringWithUTF8Replacing(reason)));
-}
-
 }  // namespace
 
 xq_status xq_evaluate(xq_context* context, const xq_query* query, xq_value** items,

@@ -216,6 +216,42 @@ static void a_limit_ends_evaluations_within_callbacks(void) {
   CHECK_OK(xq_query_free(query));
 }
 
+/* Until one compilation does not fit into what the evaluation has left. */
+static int compile_endlessly(void* data, const xq_value* value, const char* label, size_t length) {
+  char text[4000] = "1";
+  xq_query* query = NULL;
+  xq_error* error = NULL;
+  xq_category category = -1;
+  xq_status status;
+  (void)value, (void)label, (void)length;
+  while (strlen(text) + 3 < sizeof(text)) strcat(text, "+1");
+  while ((status = xq_compile(text, XQ_NUL, NULL, &query, &error)) == XQ_OK) xq_query_free(query);
+  CHECK_STATUS(status, XQ_ERROR);
+  CHECK_OK(xq_error_category(error, &category));
+  CHECK_NUMBER(category, XQ_CATEGORY_LIMIT);
+  CHECK_OK(xq_error_free(error));
+  ++*(int*)data;
+  return 0;
+}
+
+static void a_limit_ends_compilations_within_callbacks(void) {
+  xq_query* query = compiled("trace(1, 'label')");
+  xq_options* options = NULL;
+  xq_context* context = NULL;
+  xq_value* items = NULL;
+  int calls = 0;
+  CHECK_OK(xq_options_new(&options));
+  CHECK_OK(xq_options_set_timeout(options, 30000000));
+  CHECK_OK(xq_context_new(&context));
+  CHECK_OK(xq_context_set_options(context, options));
+  CHECK_OK(xq_context_set_trace(context, compile_endlessly, &calls, NULL));
+  CHECK_STATUS(xq_evaluate(context, query, &items, NULL), XQ_ERROR);
+  CHECK_NUMBER(calls, 1);
+  CHECK_OK(xq_context_free(context));
+  CHECK_OK(xq_options_free(options));
+  CHECK_OK(xq_query_free(query));
+}
+
 static void ways_and_limits_that_there_are_not_are_wrong_use(void) {
   xq_options* options = NULL;
   CHECK_OK(xq_options_new(&options));
@@ -237,6 +273,7 @@ const test_case limits_tests[] = {
     {"a signal handler cancels an evaluation", a_signal_handler_cancels_an_evaluation},
     {"a flag outlives its handle", a_flag_outlives_its_handle},
     {"a limit ends evaluations within callbacks", a_limit_ends_evaluations_within_callbacks},
+    {"a limit ends compilations within callbacks", a_limit_ends_compilations_within_callbacks},
     {"ways and limits that there are not", ways_and_limits_that_there_are_not_are_wrong_use},
     TEST_END,
 };
