@@ -131,3 +131,29 @@ def test_the_interpreter_ends_while_a_loader_is_asked(run_python: Run) -> None:
         "    print('done')\n"
     )
     assert (done.returncode, done.stdout) == (0, "done\n"), done.stderr
+
+
+@pytest.mark.parametrize(
+    "call",
+    [
+        "query.evaluate()",
+        "traced.evaluate()",
+        "xquery.parse(text)",
+        "document.find('count(a)')",
+        "document.xml()",
+    ],
+)
+def test_the_interpreter_ends_while_threads_come_back_to_it(run_python: Run, call: str) -> None:
+    done = run_python(
+        "import xquery, threading, time\n"
+        "text = '<a>' + '<b/>' * 2000 + '</a>'\n"
+        "document = xquery.parse(text)\n"
+        "query = xquery.compile('count(for $i in 1 to 300 return $i * 2)')\n"
+        "traced = xquery.compile('trace(1, \"a\")', trace=lambda label, items: None)\n"
+        "def work():\n"
+        f"    while True: {call}\n"
+        "for _ in range(6): threading.Thread(target=work, daemon=True).start()\n"
+        "time.sleep(0.1)\n"
+        "print('done')\n"
+    )
+    assert (done.returncode, done.stdout) == (0, "done\n"), done.stderr

@@ -6,8 +6,6 @@
 #include "Values.h"
 
 #include <atomic>
-#include <cxxabi.h>
-#include <unistd.h>
 #include <vector>
 
 namespace xquery::python {
@@ -25,8 +23,7 @@ class Kept {
       (void)_object.release();
       return;
     }
-    const py::gil_scoped_acquire acquired;
-    _object = py::object();
+    locked([&] { _object = py::object(); });
   }
   Kept(const Kept&) = delete;
   Kept& operator=(const Kept&) = delete;
@@ -80,18 +77,14 @@ class Loader : public XQueryLoader {
 
   std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose purpose) override {
     if (!isInterpreterAlive()) return std::nullopt;
-    try {
-      const py::gil_scoped_acquire acquired;
+    return locked([&] {
       const py::object& modules = _modules.get();
       const bool isModule = purpose == XQueryLoadPurpose::Module && !modules.is_none();
       const py::object text = toStr(URL.absoluteString()->view());
       if (isModule) return resourceFrom(modules(text));
-      if (_load.get().is_none()) return std::nullopt;
+      if (_load.get().is_none()) return std::optional<XQueryResource>();
       return resourceFrom(_load.get()(text, nameOf(purpose)));
-    } catch (abi::__forced_unwind&) {
-      // The interpreter has ended meanwhile, and takes the thread with it.
-      for (;;) pause();
-    }
+    });
   }
 
  private:
@@ -108,7 +101,6 @@ py::object resultOf(const Value& value) {
 }
 
 void tellMissing(const Settings& settings, const XQueryMissingDocument& document) {
-  const py::gil_scoped_acquire acquired;
   const py::object missing = settings.missing;
   const py::object URL = toStr(document.URL), reason = toStr(document.reason);
   if (!missing.is_none()) {
@@ -133,13 +125,14 @@ std::shared_ptr<XQueryClient> makeClient(const Settings& settings) {
   TraceHearing hear;
   if (!settings.trace.is_none()) {
     hear = [&settings](const Value& value, const Ref<NSString>& label) {
-      const py::gil_scoped_acquire acquired;
-      const py::object trace = settings.trace;
-      trace(toStr(label->view()), resultOf(value));
+      locked([&] {
+        const py::object trace = settings.trace;
+        trace(toStr(label->view()), resultOf(value));
+      });
     };
   }
   return clientHearing(std::move(hear), [&settings](const XQueryMissingDocument& document) {
-    tellMissing(settings, document);
+    locked([&] { tellMissing(settings, document); });
   });
 }
 

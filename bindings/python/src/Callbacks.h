@@ -10,10 +10,7 @@ namespace xquery::python {
 
 struct Settings;
 
-// Whether the interpreter's lock may be asked for. Threads of the library live on when the
-// interpreter ends, which then ends each thread that asks, by unwinding it, and C++ does not
-// survive that. So nothing is asked for once the end has begun, and a thread that was in a function
-// of Python at that moment stays where it is for as long as the process has left.
+// Whether threads of the library may ask for the interpreter's lock: not once its end has begun.
 bool isInterpreterAlive();
 
 // For every purpose `load`, but for library modules `modules` where it is not None; either may be

@@ -31,7 +31,7 @@ py::object parseFile(const py::bytes& path, bool isHTML, bool stripsSpace, const
   NSXMLParseError error;
   Ref<NSXMLDocument> document;
   {
-    const py::gil_scoped_release released;
+    const Unlocked released;
     document = query ? XQueryProjectedDocumentWithFile(*query->query, name, options, &error)
                      : NSXMLDocument::documentWithFile(name, options, &error);
   }
@@ -47,7 +47,7 @@ py::object parseBytes(const py::buffer& buffer, const std::string& name, bool is
   NSXMLParseError error;
   Ref<NSXMLDocument> document;
   {
-    const py::gil_scoped_release released;
+    const Unlocked released;
     document = query ? XQueryProjectedDocumentWithData(*query->query, bytes, options, &error)
                      : NSXMLDocument::documentWithData(bytes, options, &error);
   }

@@ -13,6 +13,7 @@
 //     back, since the order in which things go when a process ends is nobody's to know
 #pragma once
 
+#include "Lock.h"
 #include <xquery/xquery.h>
 
 #include <pybind11/pybind11.h>

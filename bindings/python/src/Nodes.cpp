@@ -135,7 +135,7 @@ py::object childAt(const Node& self, int64_t index) {
 py::object XMLOf(const Node& self, bool indent) {
   std::string text;
   {
-    const py::gil_scoped_release released;
+    const Unlocked released;
     if (indent) {
       XQueryWriteIndentedXML(*self.node, [&](std::string_view piece) {
         text += piece;

@@ -41,7 +41,7 @@ Compiled compile(const py::str& source, const Settings& settings, const std::str
   Ref<XQuery> query;
   Ref<NSArray> errors;
   {
-    const py::gil_scoped_release released;
+    const Unlocked released;
     query = XQuery::xqueryWithSource(text, loading, limits, wanted);
     errors = query->parseErrors();
   }
@@ -85,7 +85,7 @@ Result run(XQueryContext& context, const XQuery& query, const Settings& settings
   Ref<NSArray> items;
   Ref<NSError> failure;
   {
-    const py::gil_scoped_release released;
+    const Unlocked released;
     items = context.evaluateXQuery(query, constants, item, &error);
     failure = XQueryFirstError(items, error);
   }
@@ -284,7 +284,7 @@ void addQueries(py::module_& module) {
   module.def("evaluate", evaluate);
   module.def("evaluate_profiled", evaluateProfiled);
   module.def("library_functions", libraryFunctions);
-  module.def("release_memory", &XQueryReleaseIdleMemory, py::call_guard<py::gil_scoped_release>());
+  module.def("release_memory", &XQueryReleaseIdleMemory, py::call_guard<Unlocked>());
 }
 
 }  // namespace xquery::python

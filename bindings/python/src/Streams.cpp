@@ -15,12 +15,10 @@
 
 #include <chrono>
 #include <condition_variable>
-#include <cxxabi.h>
 #include <deque>
 #include <exception>
 #include <mutex>
 #include <thread>
-#include <unistd.h>
 
 namespace xquery::python {
 namespace {
@@ -98,7 +96,7 @@ class Stream {
     if (!_thread.joinable()) return;
     _flag->store(true);
     {
-      const py::gil_scoped_release released;
+      const Unlocked released;
       {
         const std::lock_guard held(_channel.lock);
         _channel.isClosed = true;
@@ -116,8 +114,6 @@ class Stream {
     try {
       const auto receive = [this](const Value& item) { return _channel.put(apart(item)); };
       (void)_context->evaluateStream(*_query, _constants, _input, receive, failure);
-    } catch (abi::__forced_unwind&) {
-      for (;;) pause();
     } catch (...) {
       thrown = std::current_exception();
     }
@@ -132,16 +128,17 @@ class Stream {
   ptrdiff_t readFromPython(char* buffer, size_t size) {
     if (!isInterpreterAlive()) return -1;
     try {
-      const py::gil_scoped_acquire acquired;
-      const py::object data = _read(size);
-      const auto bytes = py::reinterpret_steal<py::object>(PyBytes_FromObject(data.ptr()));
-      if (!bytes) throw py::error_already_set();
-      const auto length = static_cast<size_t>(PyBytes_GET_SIZE(bytes.ptr()));
-      if (length > size) throw py::value_error("read() answered more bytes than it was asked for");
-      std::copy_n(PyBytes_AS_STRING(bytes.ptr()), length, buffer);
-      return static_cast<ptrdiff_t>(length);
-    } catch (abi::__forced_unwind&) {
-      for (;;) pause();
+      return locked([&] {
+        const py::object data = _read(size);
+        const auto bytes = py::reinterpret_steal<py::object>(PyBytes_FromObject(data.ptr()));
+        if (!bytes) throw py::error_already_set();
+        const auto length = static_cast<size_t>(PyBytes_GET_SIZE(bytes.ptr()));
+        if (length > size) {
+          throw py::value_error("read() answered more bytes than it was asked for");
+        }
+        std::copy_n(PyBytes_AS_STRING(bytes.ptr()), length, buffer);
+        return static_cast<ptrdiff_t>(length);
+      });
     } catch (...) {
       const std::lock_guard held(_channel.lock);
       _channel.thrown = std::current_exception();
@@ -154,7 +151,7 @@ class Stream {
     bool isKnown = false;
     while (!isKnown) {
       {
-        const py::gil_scoped_release released;
+        const Unlocked released;
         std::unique_lock held(_channel.lock);
         isKnown = _channel.changed.wait_for(held, lookAtSignals, [&] {
           return !_channel.waiting.empty() || _channel.isDone || _channel.isClosed;
