@@ -125,6 +125,14 @@ def test_loaders(answer: Union[None, bytes, str, Resource], names: List[str]) ->
     assert asked == [("http://example.org/x", "document")]
 
 
+def test_text_of_a_loader_has_no_encoding_whatever_it_says() -> None:
+    text = "<?xml version='1.0' encoding='ISO-8859-1'?><a>\u00e4</a>"
+    answers: List[Union[bytes, str, Resource]] = [text, Resource(text), text.encode("latin-1")]
+    for answer in answers:
+        query = xquery.compile("string(doc('http://x/'))", loader=lambda url, purpose, a=answer: a)  # type: ignore[misc]
+        assert query.evaluate().one() == "\u00e4"
+
+
 def test_a_loader_is_asked_for_what_is_allowed() -> None:
     asked: List[str] = []
 

@@ -6,8 +6,9 @@ import gc
 import io
 import sys
 import threading
+import time
 from pathlib import Path
-from typing import Callable, List
+from typing import Callable, List, Optional
 
 import pytest
 
@@ -39,6 +40,19 @@ def test_items_of_every_source() -> None:
         assert list(query.stream(file)) == PRICES
 
 
+class OneByOne(io.StringIO):
+    def read(self, size: Optional[int] = -1, /) -> str:
+        return super().read(min(size or 0, 1))
+
+
+def test_text_has_no_encoding_whatever_it_says() -> None:
+    query = xquery.compile("for $r in /a/r return string($r)")
+    text = "<?xml version='1.0' encoding='ISO-8859-1'?><a><r>\u00e4</r></a>"
+    sources: List[xquery.Source] = [text, io.StringIO(text), OneByOne(text), text.encode("latin-1")]
+    for source in sources:
+        assert list(query.stream(source)) == ["\u00e4"]
+
+
 def test_values_and_variables() -> None:
     query = xquery.compile("declare variable $v external; for $r in /a/r return $r/@n + $v")
     assert list(query.stream(b"<a><r n='1'/><r n='2'/></a>", v=10)) == [11.0, 12.0]
@@ -68,6 +82,38 @@ def test_closing_early(long_file: Path) -> None:
         next(stream)
     stream.close()
     assert threading.active_count() == before
+
+
+def test_one_thread_asks_at_a_time_and_any_may_close() -> None:
+    asked = threading.Event()
+
+    class Slow:
+        first = True
+
+        def read(self, size: int = -1, /) -> bytes:
+            data, self.first = (b"<a>" if self.first else b"<r>1</r>"), False
+            asked.set()
+            time.sleep(0.001)
+            return data
+
+    stream = xquery.compile("for $r in /a/r[. = 2] return string($r)").stream(Slow())
+    ended: List[BaseException] = []
+
+    def ask() -> None:
+        try:
+            next(stream)
+        except (StopIteration, xquery.LimitError) as end:
+            ended.append(end)
+
+    thread = threading.Thread(target=ask)
+    thread.start()
+    assert asked.wait(60)
+    time.sleep(0.1)
+    with pytest.raises(ValueError, match="already"):
+        next(stream)
+    stream.close()
+    thread.join(60)
+    assert len(ended) == 1
 
 
 def test_letting_go_early(long_file: Path) -> None:

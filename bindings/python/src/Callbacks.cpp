@@ -48,7 +48,10 @@ constexpr const char* nameOf(XQueryLoadPurpose purpose) {
 }
 
 std::string dataFrom(const py::object& data) {
-  if (PyUnicode_Check(data.ptr())) return fromStr(data);
+  if (PyUnicode_Check(data.ptr())) {
+    // Whatever encoding it says that it had as bytes.
+    return py::module_::import("xquery._documents").attr("_utf8")(data).cast<std::string>();
+  }
   const py::object bytes = py::reinterpret_steal<py::object>(PyBytes_FromObject(data.ptr()));
   if (!bytes) throw py::error_already_set();
   return {PyBytes_AS_STRING(bytes.ptr()), static_cast<size_t>(PyBytes_GET_SIZE(bytes.ptr()))};

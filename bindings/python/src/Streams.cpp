@@ -41,6 +41,7 @@ struct Channel {
   bool isDone = false;    // nothing more comes
   XQueryStreamFailure failure;
   std::exception_ptr thrown;  // by a function of Python
+  std::thread::id asking;     // the thread that waits for items and takes them, if any
 
   // False when nobody asks.
   bool put(Value item) {
@@ -51,6 +52,28 @@ struct Channel {
     if (waiting.size() == 1) changed.notify_all();
     return true;
   }
+};
+
+// One thread asks at a time.
+class Asking {
+ public:
+  explicit Asking(Channel& channel) : _channel(channel) {
+    const std::lock_guard held(_channel.lock);
+    if (_channel.asking != std::thread::id()) {
+      throw py::value_error("the stream is being asked for its next item already");
+    }
+    _channel.asking = std::this_thread::get_id();
+  }
+  ~Asking() {
+    const std::lock_guard held(_channel.lock);
+    _channel.asking = std::thread::id();
+    _channel.changed.notify_all();
+  }
+  Asking(const Asking&) = delete;
+  Asking& operator=(const Asking&) = delete;
+
+ private:
+  Channel& _channel;
 };
 
 class Stream {
@@ -85,6 +108,7 @@ class Stream {
 
   // The next item, made an object of Python; raises StopIteration at the end.
   py::object next() {
+    const Asking asking(_channel);
     if (_taken.empty()) take();
     if (_taken.empty()) end();
     const Value item = std::move(_taken.front());
@@ -92,17 +116,26 @@ class Stream {
     return toPython(*item);
   }
 
+  // From any thread: one that asks meanwhile finds that the stream has ended.
   void close() {
     if (!_thread.joinable()) return;
+    if (_thread.get_id() == std::this_thread::get_id()) {
+      throw std::runtime_error("a stream cannot be closed by what it reads from");
+    }
+    // With the interpreter's lock held, so that only one thread waits for it.
+    std::thread thread = std::move(_thread);
     _flag->store(true);
     {
       const Unlocked released;
       {
-        const std::lock_guard held(_channel.lock);
+        std::unique_lock held(_channel.lock);
         _channel.isClosed = true;
         _channel.changed.notify_all();
+        const auto self = std::this_thread::get_id();
+        _channel.changed.wait(
+            held, [&] { return _channel.asking == std::thread::id() || _channel.asking == self; });
       }
-      _thread.join();
+      thread.join();
     }
     finish();
   }

@@ -229,7 +229,6 @@ class Stream(Iterator[Any]):
     """The items of a streamed query. Closed at its end, by ``close``, and by ``with``."""
 
     def __init__(self, query: Query, source: Source, variables: Dict[str, Any]) -> None:
-        self._file: Any = None
         path, read, name = b"", None, "document"
         if isinstance(source, (bytes, bytearray, memoryview)) or (
             isinstance(source, str) and _is_text(source)
@@ -288,16 +287,28 @@ class _Reading:
         return piece
 
 
+#: Characters of a declaration of XML, which are a few.
+_MOST_DECLARED = 1000
+
+
 def _reader(file: Any) -> Any:
     """What reads at most so many bytes of a file, of bytes or of text."""
     rest = b""
+    is_first = True
 
     def read(size: int) -> bytes:
-        nonlocal rest
+        nonlocal rest, is_first
         # A character takes up to four bytes.
         data = rest or file.read(size // 4 if size >= 4 else 1)
         if isinstance(data, str):
-            data = data.encode()
+            # What declares an encoding comes at once, however little is read at a time.
+            while is_first and ">" not in data and len(data) < _MOST_DECLARED:
+                more = file.read(1)
+                if not more:
+                    break
+                data += more
+            data = _utf8(data) if is_first else data.encode()
+        is_first = False
         rest = data[size:]
         return bytes(data[:size])
 
