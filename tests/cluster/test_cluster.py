@@ -4,7 +4,11 @@ By hand, for figures: XQUERY_CLUSTER_FILES=2000 and XQUERY_CLUSTER_MEGABYTES=102
 make the tests of many files and of a large document long, and with -s they tell how long they took.
 """
 
+import doctest
+import gzip
 import os
+import pathlib
+import re
 import subprocess
 import time
 
@@ -14,6 +18,7 @@ from xquery import cluster as xc
 
 from poison import poison
 
+PAGE = pathlib.Path(__file__).resolve().parents[2] / "docs" / "cluster.md"
 FILES = int(os.environ.get("XQUERY_CLUSTER_FILES", "100"))
 MEGABYTES = int(os.environ.get("XQUERY_CLUSTER_MEGABYTES", "3"))
 SUM = "declare variable $results external; sum($results)"
@@ -77,6 +82,9 @@ def test_items_of_every_kind_arrive(two_workers, folder):
     assert [type(item) for item in items[2:]] == [type(item) for item in here[2:]]
     nodes = xc.map(two_workers.client, "/people/person/name", paths,
                    "declare variable $results external; <all>{ $results }</all>")
+    empty = xc.map(two_workers.client, "document { () }", paths,
+                   "declare variable $results external; count($results)")
+    assert (empty.results, empty.combined) == ([[""]], [1])
     assert nodes.combined[0].xml() == "<all><name>Ünal 0</name><name>Ünal 1</name></all>"
 
 
@@ -229,7 +237,8 @@ def test_a_large_document_is_cut_and_folded(two_workers, folder):
     pieces.mkdir()
     started = time.monotonic()
     each = max(1000, count // 50)
-    records = xc.Records(site, "/site/people/person", each, pieces)
+    # However the folder is written.
+    records = xc.Records(site, "/site/people/person", each, f"{os.path.relpath(pieces)}/")
     query = "(count(/site[@year = 2004]/people/person), sum(//income))"
     outcome = xc.map(
         two_workers.client, query, [records],
@@ -278,3 +287,21 @@ def test_a_large_document_that_is_bad_is_reported(two_workers, folder):
     assert isinstance(third, xquery.Error) and third.number == 3
     with pytest.raises(ValueError):
         xc.Records(site, "/site/person", 0)
+
+
+def test_examples_of_the_page_and_of_the_module(two_workers, folder, monkeypatch, capsys):
+    failed, tried = doctest.testmod(xc)
+    assert failed == 0 and tried > 0
+    blocks = re.findall(r"^```python\n(.*?)^```", PAGE.read_text(), re.MULTILINE | re.DOTALL)
+    assert len(blocks) == 2
+    (folder / "orders").mkdir()
+    for name, total in (("2003.xml.gz", 7), ("2004.xml.gz", 35)):
+        order = f"<order country='DE'><total>{total}</total></order>"
+        data = f"<orders>{order}<order country='FR'><total>1</total></order></orders>"
+        (folder / "orders" / name).write_bytes(gzip.compress(data.encode()))
+    write_site(folder / "site.xml", 1)
+    monkeypatch.setattr("distributed.Client", lambda address: two_workers.client)
+    names = {"client": two_workers.client}
+    for block in blocks:
+        exec(block.replace("/data/", f"{folder}/"), names)
+    assert capsys.readouterr().out == "[42.0]\n"

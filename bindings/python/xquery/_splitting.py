@@ -49,7 +49,8 @@ class Records:
         self.path = os.fspath(path)
         self.records = records
         self.count = count
-        self.folder = None if folder is None else os.fspath(folder)
+        # As workers know it, wherever they were started.
+        self.folder = None if folder is None else os.path.abspath(folder)
         self.namespaces = dict(namespaces or {})
         self.keep = keep
         self.command = command

@@ -240,7 +240,8 @@ def _sent(item: Any) -> Any:
     """An item as it can travel. A node that cannot be a document is its text."""
     if not isinstance(item, xquery.Node):
         return item
-    return XML(item.xml()) if item.kind in ("element", "document") else item.text
+    is_whole = item.kind == "document" and any(child.kind == "element" for child in item)
+    return XML(item.xml()) if item.kind == "element" or is_whole else item.text
 
 
 def _picklable(error: BaseException) -> BaseException:
