@@ -129,7 +129,7 @@ def test_text_of_a_loader_has_no_encoding_whatever_it_says() -> None:
     text = "<?xml version='1.0' encoding='ISO-8859-1'?><a>\u00e4</a>"
     answers: List[Union[bytes, str, Resource]] = [text, Resource(text), text.encode("latin-1")]
     for answer in answers:
-        query = xquery.compile("string(doc('http://x/'))", loader=lambda url, purpose, a=answer: a)  # type: ignore[misc]
+        query = xquery.compile("string(doc('http://x/'))", loader=lambda url, purpose, a=answer: a)
         assert query.evaluate().one() == "\u00e4"
 
 
