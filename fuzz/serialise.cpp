@@ -227,7 +227,8 @@ class Builder {
 
 void checkOrder(const NSXMLNode* root) {
   for (const NSXMLNode* node = root; const NSXMLNode* next = node->nextNode(); node = next) {
-    check(NSXMLNode::compareOrder(node, next) < 0, "nodes out of order", root->XMLString()->utf8());
+    const bool isOrdered = NSXMLNode::compareOrder(node, next) < 0;
+    if (!isOrdered) fail("nodes out of order", root->XMLString()->utf8());
   }
 }
 
