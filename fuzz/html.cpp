@@ -1,6 +1,5 @@
 // HTML text: whatever the bytes are, they are a document or an error. A document has html, head and
 // body, what is written of it is read back as the same tree, and as HTML again it is HTML still.
-#include "Platform/Reading/TreeDifference.h"
 #include "support/Failure.h"
 #include "xquery/XMLNode.h"
 
