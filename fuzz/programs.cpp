@@ -114,7 +114,7 @@ class Comparison {
   }
 
   void compare(const Lines& expected, const Lines& found, const char* way) const {
-    if (expected == found || endedAtLimit(found)) return;
+    if (expected == found || endedAtLimit(expected) || endedAtLimit(found)) return;
     fail(std::string(way) + " otherwise than plain",
          std::string(_program) + "\n" + std::string(_xml) + "\nfound\n" + shown(found) +
              "expected\n" + shown(expected));
