@@ -7,6 +7,7 @@
 #include <memory>
 #include <optional>
 #include <string_view>
+#include <tuple>
 #include <unistd.h>
 #include <utility>
 
