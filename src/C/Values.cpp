@@ -3,7 +3,6 @@
 
 #include "C/Nodes.h"
 #include "C/Texts.h"
-#include "Types/XQueryNumber.h"
 #include "xquery/Values.h"
 
 #include <algorithm>
@@ -95,10 +94,8 @@ xq_status xq_value_add_double(xq_value* value, double number) {
   return addItem(value, [&] { return XQueryMakeDouble(number); });
 }
 
-// Of type xs:float even where it is NaN or an infinity.
 xq_status xq_value_add_float(xq_value* value, float number) {
-  return addItem(value,
-                 [&] { return XQueryNumber::floatWithNumber(*NSNumber::numberWithFloat(number)); });
+  return addItem(value, [&] { return XQueryMakeFloat(number); });
 }
 
 xq_status xq_value_add_boolean(xq_value* value, int boolean) {

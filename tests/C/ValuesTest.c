@@ -76,7 +76,10 @@ static void doubles_and_floats_are_what_they_were(void) {
   check_only(value, XQ_TYPE_FLOAT, "xs:float", "0.1");
   value = new_value();
   CHECK_OK(xq_value_add_float(value, -INFINITY));
-  check_only(value, XQ_TYPE_FLOAT, "xs:float", "-INF");
+  check_only(value, XQ_TYPE_DOUBLE, "xs:double", "-INF");
+  value = new_value();
+  CHECK_OK(xq_value_add_text(value, XQ_TYPE_FLOAT, "INF", XQ_NUL));
+  check_only(value, XQ_TYPE_DOUBLE, "xs:double", "INF");
 }
 
 static void booleans_are_true_or_false(void) {

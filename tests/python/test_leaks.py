@@ -16,12 +16,26 @@ import xquery
 Run = Callable[[str], "subprocess.CompletedProcess[str]"]
 
 
-def resident() -> int:
+def resident_now() -> int:
     """Bytes of memory that the process has."""
-    gc.collect()
-    xquery.release_memory()
     with open("/proc/self/statm") as file:
         return int(file.readline().split()[1]) * os.sysconf("SC_PAGE_SIZE")
+
+
+def resident() -> int:
+    """The same once nothing is idle."""
+    gc.collect()
+    xquery.release_memory()
+    return resident_now()
+
+
+def test_idle_memory_is_given_back_when_it_is_asked_for() -> None:
+    before = resident()
+    xquery.query("count(for $i in 1 to 300000 order by -$i return <a>{$i}</a>)")
+    idle = resident_now()
+    assert idle - before > 4 << 20
+    xquery.release_memory()
+    assert resident_now() - before < (idle - before) / 2
 
 
 def test_ten_thousand_documents_leave_nothing() -> None:

@@ -197,8 +197,3 @@ def test_representation() -> None:
 def test_policies_are_values() -> None:
     assert xquery.Policy.deny().allow_files("/a") == xquery.Policy.deny().allow_files(Path("/a"))
     assert xquery.Policy.deny() != xquery.Policy()
-
-
-def test_memory_is_given_back() -> None:
-    xquery.query("count((1 to 100000, 'a'))")
-    xquery.release_memory()

@@ -103,6 +103,7 @@ XQUERY_EXPORT xq_status xq_value_free(xq_value* value);
 XQUERY_EXPORT xq_status xq_value_add_integer(xq_value* value, int64_t integer);
 XQUERY_EXPORT xq_status xq_value_add_unsigned(xq_value* value, uint64_t integer);
 XQUERY_EXPORT xq_status xq_value_add_double(xq_value* value, double number);
+/* NaN and the infinities are those of xs:double, as they are in a query. */
 XQUERY_EXPORT xq_status xq_value_add_float(xq_value* value, float number);
 /* Anything but 0 is true. */
 XQUERY_EXPORT xq_status xq_value_add_boolean(xq_value* value, int boolean);
