@@ -200,6 +200,32 @@ TEST(Counting, NodesBelowOneAreNotKept) {
   EXPECT_EQ(XQueryItemStringValue(*items->objectAtIndex(0)), std::to_string(2 * count + 1));
 }
 
+// From the last child of a last child, descendants go on to the end of the document.
+TEST(Counting, NodesThatSeveralWalksReachAreCountedOnce) {
+  std::string text;
+  for (int i = 0; i < 6; ++i) {
+    text += "<x><y><z><c><d/><d/></c></z><z><c><d/></c><c/></z></y><k><c/></k></x>";
+    text += "<x><y><z><c e=''/><!----></z></y></x>";
+  }
+  const Value one = document("<r>" + text + "</r>");
+  const Value other = document("<!--a--><r>" + text + "</r><?b?>");
+  for (const Value& tree : {one, other}) {
+    for (const char* path :
+         {"/r//c", "/r/x//c", "/r/x/y//c", "/r/x/y/z//c", "/r/x/y/z/c//d", "/r/x/y/descendant::c",
+          "/r/x/y/z/descendant::c", "/r/*/*/*//*", "/r/x/y/z/descendant::node()",
+          "/r/x/y/z//comment()", "/r/x/y/z//@e", "/r/x/y/z//(c | d)", "(/r/x/y/z)//c", "r/x/y/z//c",
+          "/r/x/y/z//c | /r/x/y/z//d", "for $a in /r/x/y/z//c return $a",
+          "for $a in /r/x/y/z/c//d return $a", "for $a in /r/x/y/z//c, $b in $a/d return $b"}) {
+      sameBothWays(std::string("count(") + path + ")", tree);
+      sameBothWays(std::string("for $i in 1 to 4 return count(") + path + ") > $i", tree);
+    }
+    sameBothWays("for $r in /r return (count($r/x/y//c), count($r/x/y/z//c))", tree);
+    sameBothWays("for $x in //x return (count($x/y//c), count($x/y/z//c))", tree);
+    sameBothWays("let $d := document { /r, /r } return (count($d/r/x//c), count($d/r/x/y//c))",
+                 tree);
+  }
+}
+
 TEST(Counting, WhatStandsBetweenCommasFailsInItsTurn) {
   for (const char* text : {
            "count((//a, error()))",

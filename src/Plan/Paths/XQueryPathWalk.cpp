@@ -26,6 +26,10 @@ bool descendantsAreSubtree(const NSXMLNode* node) {
   return XQueryDescendantStop(node) || !node->parent() || !node->parent()->parent();
 }
 
+bool isOnlyChild(const NSXMLNode* node) {
+  return !node->previousSibling() && !node->nextSibling();
+}
+
 // Counts nodes that no other walk finds, so that none has to be kept.
 class CountVisit {
  public:
@@ -259,16 +263,23 @@ void XQueryPathWalk::takeEachKept(size_t index, std::span<NSXMLNode* const> node
 }
 
 // Whether nothing is asked of what this walk finds but its number, and no other walk of the step
-// finds the same: from one node, children of children lie beside each other.
-bool XQueryPathWalk::onlyCounts(size_t index, int axis) const {
+// finds the same: from one node, children of children lie beside each other. A walk from the last
+// child of a last child goes on to the end of the document, where others that walks start from may
+// lie if the two are not the last of all: further down than children of children, or than their
+// children where what the path starts from has a single child.
+bool XQueryPathWalk::onlyCounts(size_t index, int axis, const NSXMLNode* node) const {
   const bool goesDown = axis == XQueryAxisDescendant || axis == XQueryAxisAttributesBelow;
   const XQueryWalkedStep& step = _steps[index];
   if (!goesDown || index + 1 != _steps.size() || step.hasPredicates()) return false;
   if (!startsFromOne || !results.countsOnly() || setsEveryFocus || listingStep) return false;
   const bool isJoined = step.axis != axis;  // with the "//" before it
   const auto before = _steps.first(isJoined ? index - 1 : index);
-  return std::all_of(before.begin(), before.end(),
-                     [](const XQueryWalkedStep& each) { return each.axis == XQueryAxisChild; });
+  const bool areChildren =
+      std::all_of(before.begin(), before.end(),
+                  [](const XQueryWalkedStep& each) { return each.axis == XQueryAxisChild; });
+  constexpr size_t mostApart = 2;
+  if (!areChildren || before.size() <= mostApart) return areChildren;
+  return before.size() == mostApart + 1 && isOnlyChild(node->parent()->parent());
 }
 
 // Whether it is of use to ask the predicates before all nodes are found, and nobody can tell.
@@ -355,7 +366,7 @@ void XQueryPathWalk::stream(size_t index, int axis, NSXMLNode* node) {
   XQueryStepTest test(_steps[index], *this);
   const NSXMLExpandedName* const name = test.onlyName();
   const bool isNamed = name || test.onlyNames();
-  if ((isNamed || !_steps[index].testMayRaise) && onlyCounts(index, axis)) {
+  if ((isNamed || !_steps[index].testMayRaise) && onlyCounts(index, axis, node)) {
     count(_steps[index], axis, node);
   } else if (name) {
     streamMatching(index, axis, node, [name](auto act) { return XQueryNamedVisit(name, act); });

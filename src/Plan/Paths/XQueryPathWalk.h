@@ -114,7 +114,7 @@ class XQueryPathWalk : public XQueryPathRun {
                     std::vector<NSXMLNode*>& nodes);
   void collectFromBack(const XQueryWalkedStep& step, const NSXMLNode* node,
                        std::vector<NSXMLNode*>& nodes);
-  bool onlyCounts(size_t index, int axis) const;
+  bool onlyCounts(size_t index, int axis, const NSXMLNode* node) const;
   void count(const XQueryWalkedStep& step, int axis, NSXMLNode* node);
   bool filtersEach(const XQueryWalkedStep& step) const;
   bool keepsAlone(const XQueryWalkedStep& step, size_t firstPredicate, NSXMLNode* node);
