@@ -1,5 +1,5 @@
 // Where values stand in a list: from a table what looking through the list answers.
-#include "Plan/PlanTesting.h"
+#include "Plan/RulesTesting.h"
 
 #include <string>
 
@@ -56,6 +56,24 @@ TEST(PositionLookup, SeesThatTheListHasGrown) {
   sameBothWays(
       "for $e in (<e>{for $n in 1 to 20 return <f>{$n}</f>}</e>) let $l := $e/f return "
       "(for $x in ('1', '2', '3', '1') return (index-of($l, $x), <g>{$l[1]}</g>))");
+}
+
+// A node, whose value is not taken, is none of the values of the list.
+TEST(PositionLookup, AnswersAtOnceForNodes) {
+  constexpr const char* wanted[] = {"//i[3]", "/", "//comment()", "<i>3</i>", "//i[b][2]/b"};
+  for (const char* node : wanted) {
+    sameBothWays(
+        "let $l := //i for $n in 1 to 3 return index-of($l, (" + std::string(node) + ")[1])",
+        things());
+    sameBothWays("let $l := (//i, true(), <i>3</i>) for $n in 1 to 3 return count(index-of($l, (" +
+                     std::string(node) + ")[1]))",
+                 things());
+  }
+  const auto steps = [](const std::string& value) {
+    const std::string query = "let $l := (1 to 50000) for $n in 1 to 100 return index-of($l, (";
+    return stepsOf((query + value + ", $n)[1])").c_str());
+  };
+  EXPECT_LT(steps("/r"), steps("xs:date('2004-10-29')") / 4);
 }
 
 }  // namespace

@@ -17,8 +17,9 @@ class XQueryPositionLookup : public XQueryPlannedExpr {
     return make<XQueryPositionLookup>(std::move(plain), std::move(list), std::move(wanted));
   }
 
-  // The positions from a table of the list, as long as the list is the same; what the call answers
-  // for anything but a text or a number, and while no table is worth its making.
+  // The positions from a table of the list, as long as the list is the same, and none for a node;
+  // what the call answers for anything else but a text or a number, and while no table is worth its
+  // making.
   Value computeValue(XQueryContext& context) const override;
 
  protected:
