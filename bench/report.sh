@@ -10,5 +10,5 @@ set -eu
 . "$(dirname "${BASH_SOURCE[0]}")/../cmake/prepare.sh"
 
 need_packages "${packages[@]}" python3 python3-matplotlib python3-lxml
-build release -- xquery_command xquery_bench xquery_auction xquery_bibliography xquery_business
+build release -- xquery-command xquery_bench xquery_auction xquery_bibliography xquery_business
 exec /usr/bin/python3 "$top/bench/report" --top "$top" "$@"

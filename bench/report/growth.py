@@ -34,8 +34,8 @@ def measure(bench: Bench) -> dict[str, Any]:
 
 def write(figures: dict[str, Any], plots: Path) -> list[str]:
     text = ["The time of a query over a document, over its own time at 10 MB, which would grow as the",
-            "first line does if it were in proportion to the document; a dash where it took over two",
-            "minutes, or more memory than there is.", ""]
+            "first line does if it were in proportion to the document; a dash where it took over a",
+            "minute, or more memory than there is.", ""]
     here = SIZES.index(10)
     rows: list[list[str | float | None]] = [["in proportion", "", *(size / 10 for size in SIZES)]]
     for query, sides in figures.items():

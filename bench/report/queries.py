@@ -11,7 +11,7 @@ from running import Failed
 
 TITLE = "Queries"
 SIZES = (10, 100)
-LIMIT = 120
+LIMIT = 60
 
 
 def measure(bench: Bench) -> dict[str, Any]:

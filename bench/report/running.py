@@ -2,6 +2,8 @@
 from __future__ import annotations
 
 import os
+import re
+import resource
 import signal
 import statistics
 import subprocess
@@ -23,39 +25,57 @@ class Run:
 
 
 class Failed(Exception):
-    """A command that ended with another status than 0, or not in time."""
+    """A command that ended with another status than a good one, or not in time."""
 
 
-def run(command: Sequence[str | Path], limit: float = 120, stdin: Path | None = None) -> Run:
+def run(command: Sequence[str | Path], limit: float = 120, stdin: Path | None = None,
+        good: Sequence[int] = (0,)) -> Run:
     """Runs to the end; the output is the standard one and that for errors together."""
     with tempfile.TemporaryFile() as said, open(stdin or os.devnull, "rb") as given:
         began = time.perf_counter()
         process = subprocess.Popen([str(word) for word in command], stdin=given, stdout=said,
                                    stderr=subprocess.STDOUT, start_new_session=True)
-        status, usage = wait(process, began + limit)
+        status, usage, seen = wait(process, began + limit)
         seconds = time.perf_counter() - began
         said.seek(0)
         output = said.read().decode("utf-8", "replace")
     if status is None:
         raise Failed(f"over {limit:.0f} s")
-    if status != 0:
+    if status not in good:
         raise Failed(f"status {status}: {' '.join(output.split())[-200:]}")
-    return Run(seconds, usage.ru_utime + usage.ru_stime, usage.ru_maxrss * 1024, output)
+    # What a process held before it became the command, which is our own memory, counts as its peak,
+    # too: below ours only what was seen meanwhile tells.
+    ours = resource.getrusage(resource.RUSAGE_SELF).ru_maxrss
+    peak = usage.ru_maxrss if usage.ru_maxrss > ours else seen
+    return Run(seconds, usage.ru_utime + usage.ru_stime, peak * 1024, output)
 
 
 def wait(process: subprocess.Popen[bytes], until: float):
-    """The status, none where time ran out, and what the process and its children used."""
+    """The status, none where time ran out, what the process and its children used, and the most
+    memory that it was seen to hold, in KiB."""
+    seen = 0
     while True:
         pid, status, usage = os.wait4(process.pid, os.WNOHANG)
         if pid:
             process.returncode = os.waitstatus_to_exitcode(status)
-            return process.returncode, usage
+            return process.returncode, usage, seen
+        seen = max(seen, held(process.pid))
         if time.perf_counter() > until:
             os.killpg(process.pid, signal.SIGKILL)
             _, _, usage = os.wait4(process.pid, 0)
             process.returncode = -signal.SIGKILL
-            return None, usage
+            return None, usage, seen
         time.sleep(0.0005)
+
+
+def held(pid: int) -> int:
+    """The most memory a running process has held so far, in KiB; nothing for one that has ended."""
+    try:
+        said = Path(f"/proc/{pid}/status").read_text()
+    except OSError:
+        return 0
+    found = re.search(r"VmHWM:\s+(\d+)", said)
+    return int(found.group(1)) if found else 0
 
 
 def in_turn(sides: dict[str, Callable[[], float]], rounds: int) -> dict[str, float | None]:
