@@ -23,7 +23,7 @@ inline xquery::Ref<xquery::XQuery> compile(const std::string& text) {
 // The number of items in the result.
 inline size_t evaluate(xquery::XQueryContext& context, const xquery::XQuery& query,
                        const xquery::Value& contextItem,
-                       const xquery::XQueryConstants& constants = {}) {
+                       const xquery::XQueryVariables& constants = {}) {
   xquery::Ref<xquery::XQueryError> error;
   const auto items = context.evaluateXQuery(query, constants, contextItem, &error);
   if (!items) throw std::runtime_error(error ? error->description()->utf8() : "no result");

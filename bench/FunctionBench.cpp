@@ -61,7 +61,7 @@ Value integersUpTo(int last) {
   return XQueryContext::xqueryContext()->evaluateXQuery(*query, {}, {});
 }
 
-XQueryConstants inputsOfSize(int size) {
+XQueryVariables inputsOfSize(int size) {
   const auto count = static_cast<size_t>(size);
   std::u16string wide;
   std::string list;
@@ -70,23 +70,23 @@ XQueryConstants inputsOfSize(int size) {
     wide += u"some t\u00E9xt"[index % 9];
     const std::string word = "word" + std::to_string(index);
     list += (index ? "," : "") + word;
-    words.push_back(XQueryUntypedAtomic(word));
-    others.push_back(XQueryUntypedAtomic(word));
+    words.push_back(NSString::stringWithUTF8(word));
+    others.push_back(NSString::stringWithUTF8(word));
   }
   std::string text;
   for (const char16_t unit : wide) text += unit < 0x80 ? static_cast<char>(unit) : 'e';
-  return {{"text", XQueryUntypedAtomic(text)},
+  return {{"text", NSString::stringWithUTF8(text)},
           {"wide", NSString::stringWithUTF16(wide)},
-          {"same", XQueryUntypedAtomic(std::string(count, 'a'))},
-          {"part", XQueryUntypedAtomic(std::string(count / 2, 'a') + "b")},
-          {"list", XQueryUntypedAtomic(list)},
+          {"same", NSString::stringWithUTF8(std::string(count, 'a'))},
+          {"part", NSString::stringWithUTF8(std::string(count / 2, 'a') + "b")},
+          {"list", NSString::stringWithUTF8(list)},
           {"words", NSArray::arrayWithObjects(std::move(words))},
           {"others", NSArray::arrayWithObjects(std::move(others))},
           {"numbers", integersUpTo(size)}};
 }
 
 // The best of several evaluations, in nanoseconds.
-double timeOf(const XQuery& query, const XQueryConstants& constants) {
+double timeOf(const XQuery& query, const XQueryVariables& constants) {
   const auto context = XQueryContext::xqueryContext();
   const double end = processorSeconds() + 0.05;
   double best = std::numeric_limits<double>::infinity();
@@ -110,7 +110,7 @@ int reportFunctions() {
   constexpr double mostGrowth = 50;
   std::vector<std::vector<double>> times(std::size(rows));
   for (const int size : sizes) {
-    const XQueryConstants inputs = inputsOfSize(size);
+    const XQueryVariables inputs = inputsOfSize(size);
     for (size_t row = 0; row < std::size(rows); ++row) {
       const auto query = compile(std::string(prolog) + rows[row].query);
       try {

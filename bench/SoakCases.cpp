@@ -69,7 +69,7 @@ struct Sections {
   void header(const std::string& line) {
     std::tie(section, name) = splitAt(line, ' ');
     const auto [key, value] = splitAt(name, '=');
-    if (section == "var") found.constants[key] = XQueryUntypedAtomic(value);
+    if (section == "var") found.constants[key] = NSString::stringWithUTF8(value);
     if (section == "namespace") found.namespaces[key] = value;
   }
   void content(const std::string& line) {

@@ -14,7 +14,7 @@ struct SoakCase {
   std::string file;  // and line, of its name
   int line = 0;
   std::string text;
-  xquery::XQueryConstants constants;
+  xquery::XQueryVariables constants;
   std::map<std::string, std::string> namespaces;
   std::map<std::string, std::string> modules;
   xquery::Value document;  // null for none; shared by all cases with the same text

@@ -156,10 +156,10 @@ Ref<NSXMLDocument> readInput(const Options& options, const std::string& path, co
   return readWith(reader, options, path, markup);
 }
 
-XQueryConstants bindConstants(const Options& options) {
-  XQueryConstants constants;
+XQueryVariables bindConstants(const Options& options) {
+  XQueryVariables constants;
   for (const Binding& binding : options.variables) {
-    constants[binding.name] = XQueryUntypedAtomic(binding.value);
+    constants[binding.name] = NSString::stringWithUTF8(binding.value);
   }
   for (const Binding& binding : options.documents) {
     const bool isHTML = options.html && !isNamedXML(binding.value);

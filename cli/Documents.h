@@ -57,6 +57,6 @@ std::string inputName(const std::string& path);
 std::string shownName(const std::string& path);
 
 // The variables and documents that the options bind; throws Failure.
-xquery::XQueryConstants bindConstants(const Options& options);
+xquery::XQueryVariables bindConstants(const Options& options);
 
 }  // namespace cli

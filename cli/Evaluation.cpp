@@ -56,7 +56,7 @@ Evaluation::Evaluation(const Options& options, std::shared_ptr<XQueryClient> cli
   _context->contextSetClient(std::move(client));
 }
 
-Ref<NSArray> Evaluation::evaluate(const XQuery& query, const XQueryConstants& constants,
+Ref<NSArray> Evaluation::evaluate(const XQuery& query, const XQueryVariables& constants,
                                   const Value& contextItem) {
   const UnderWay evaluating;
   Ref<XQueryError> error;
@@ -67,7 +67,7 @@ Ref<NSArray> Evaluation::evaluate(const XQuery& query, const XQueryConstants& co
   return items;
 }
 
-bool Evaluation::evaluateStream(const XQuery& query, const XQueryConstants& constants,
+bool Evaluation::evaluateStream(const XQuery& query, const XQueryVariables& constants,
                                 const XQueryStreamInput& input,
                                 const std::function<bool(const Value& item)>& receive,
                                 XQueryStreamFailure& failure) {

@@ -22,10 +22,10 @@ class Evaluation {
   // The client may be null.
   Evaluation(const Options& options, std::shared_ptr<xquery::XQueryClient> client);
   xquery::Ref<xquery::NSArray> evaluate(const xquery::XQuery& query,
-                                        const xquery::XQueryConstants& constants,
+                                        const xquery::XQueryVariables& constants,
                                         const xquery::Value& contextItem);
   // As XQueryContext::evaluateStream.
-  bool evaluateStream(const xquery::XQuery& query, const xquery::XQueryConstants& constants,
+  bool evaluateStream(const xquery::XQuery& query, const xquery::XQueryVariables& constants,
                       const xquery::XQueryStreamInput& input,
                       const std::function<bool(const xquery::Value& item)>& receive,
                       xquery::XQueryStreamFailure& failure);

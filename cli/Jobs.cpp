@@ -30,7 +30,7 @@ unsigned numberOfJobs(const Options& options, size_t inputs) {
 
 class Jobs {
  public:
-  Jobs(const Options& options, const XQuery& query, const XQueryConstants& constants,
+  Jobs(const Options& options, const XQuery& query, const XQueryVariables& constants,
        const std::optional<std::vector<Input>>& inputs, Phases& phases, Profile* profile)
       : _options(options),
         _query(query),
@@ -60,7 +60,7 @@ class Jobs {
 
   const Options& _options;
   const XQuery& _query;
-  const XQueryConstants& _constants;
+  const XQueryVariables& _constants;
   const std::optional<std::vector<Input>>& _inputs;
   const size_t _parts;
   const unsigned _jobs;
@@ -195,7 +195,7 @@ std::string Jobs::reported(const Input* input, const Failure& failure) const {
 
 }  // namespace
 
-Status runJobs(const Options& options, const XQuery& query, const XQueryConstants& constants,
+Status runJobs(const Options& options, const XQuery& query, const XQueryVariables& constants,
                const std::optional<std::vector<Input>>& inputs, Phases& phases, Profile* profile) {
   return Jobs(options, query, constants, inputs, phases, profile).run();
 }

@@ -17,7 +17,7 @@ namespace cli {
 // cannot be written. The profile, which may be null, is added to, and written before an interrupt
 // ends the process.
 [[nodiscard]] Status runJobs(const Options& options, const xquery::XQuery& query,
-                             const xquery::XQueryConstants& constants,
+                             const xquery::XQueryVariables& constants,
                              const std::optional<std::vector<Input>>& inputs, Phases& phases,
                              Profile* profile);
 

@@ -39,7 +39,8 @@ std::vector<const NSXMLElement*> elementsAround(const NSXMLNode& node) {
 Pieces::Pieces(std::string folder, uint64_t records, Receiver receive)
     : _folder(std::move(folder)), _records(records), _receive(std::move(receive)) {}
 
-void Pieces::beginRecord(size_t elementsKept) {
+void Pieces::beginRecord(const NSXMLElement& record, size_t elementsKept) {
+  _document = record.rootDocument();
   for (size_t depth = elementsKept; depth < _open.size(); ++depth) _open[depth].element = nullptr;
   _last = nullptr;
 }
@@ -55,7 +56,10 @@ void Pieces::add(const NSObject& item) {
   if (!element) {
     throw wrongPath("an item of type " + XQueryItemTypeName(item) + ", which is no element");
   }
-  if (!element->rootDocument()) throw wrongPath("an element that is not the document's");
+  const NSXMLDocument* document = element->rootDocument();
+  if (!document || document != _document) {
+    throw wrongPath("an element that is not the document's");
+  }
   if (isInLast(*element)) return;
   if (_last && NSXMLNode::compareOrder(_last, element) >= 0) {
     throw wrongPath("elements in another order than the document's");
@@ -75,7 +79,6 @@ void Pieces::enter(const std::vector<const NSXMLElement*>& above) {
   while (common < std::min(_open.size(), above.size()) && _open[common].element == above[common]) {
     ++common;
   }
-  if (common == 0 && _count > 0) throw wrongPath("elements of more than one document");
   leaveTo(common);
   for (; common < above.size(); ++common) {
     XQueryWriteStartTag(*above[common], [this](std::string_view text) { return write(text); });

@@ -27,7 +27,7 @@ class Pieces {
   Pieces(std::string folder, uint64_t records, Receiver receive);
 
   // From here on, only so many of the elements that records are in are those from before.
-  void beginRecord(size_t elementsKept);
+  void beginRecord(const xquery::NSXMLElement& record, size_t elementsKept);
   // An element within the record; nothing happens where it lies in one that was added before, which
   // holds it already. All of these throw Failure, where the item is no element of the document,
   // does not come in the order of the document, or cannot be written.
@@ -57,7 +57,8 @@ class Pieces {
   std::string _path;
   std::optional<Output> _output;  // where there is a piece that is not whole
   std::vector<Open> _open;
-  const xquery::NSXMLElement* _last = nullptr;  // that was added within the record
+  const xquery::NSXMLDocument* _document = nullptr;  // that is cut
+  const xquery::NSXMLElement* _last = nullptr;       // that was added within the record
 };
 
 }  // namespace cli

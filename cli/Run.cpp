@@ -40,7 +40,7 @@ void reportWarnings(const Options& options, const XQuery& query, const Ref<NSStr
 }
 
 // The profile is written of all that was evaluated, whatever became of it.
-Status evaluateAll(const Options& options, const XQuery& query, const XQueryConstants& constants,
+Status evaluateAll(const Options& options, const XQuery& query, const XQueryVariables& constants,
                    const std::optional<std::vector<Input>>& inputs, Phases& phases) {
   std::optional<Profile> profile;
   if (options.profileFile) profile.emplace(options, query);
@@ -67,7 +67,7 @@ Status runPhases(const Options& options) {
     printPlan(options, *query);
     return StatusResult;
   }
-  const XQueryConstants constants = phases.parse.measure([&] { return bindConstants(options); });
+  const XQueryVariables constants = phases.parse.measure([&] { return bindConstants(options); });
   if (options.stream) {
     const Status status = options.splitPath ? runSplit(options, *query, constants, phases)
                                             : runStream(options, *query, constants, phases);

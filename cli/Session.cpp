@@ -104,7 +104,7 @@ class Session {
   std::map<std::string, std::string> namespaces() const;
 
   Options _options;
-  XQueryConstants _constants;
+  XQueryVariables _constants;
   Value _contextItem;
   std::string _inputName;
   Declarations _declarations;

@@ -35,7 +35,7 @@ class Split {
         _pieces(*options.splitFolder, options.records,
                 [this](const std::string& path) { tellOfPiece(path); }) {}
 
-  void run(const XQuery& query, const XQueryConstants& constants);
+  void run(const XQuery& query, const XQueryVariables& constants);
 
  private:
   // A stream hears of a failure by false, and ends.
@@ -50,7 +50,7 @@ class Split {
     }
   }
   void tellOfPiece(const std::string& path);
-  void evaluate(const XQuery& query, const XQueryConstants& constants);
+  void evaluate(const XQuery& query, const XQueryVariables& constants);
 
   const Options& _options;
   Output _names;
@@ -58,7 +58,7 @@ class Split {
   std::optional<Failure> _failure;
 };
 
-void Split::run(const XQuery& query, const XQueryConstants& constants) {
+void Split::run(const XQuery& query, const XQueryVariables& constants) {
   refuseOutputAsInput(_options, _options.inputs.front());
   prepareFolder(*_options.splitFolder);
   if (!_names.open(std::nullopt)) throw writingFailure(std::nullopt, _names.error());
@@ -67,9 +67,11 @@ void Split::run(const XQuery& query, const XQueryConstants& constants) {
   if (!_names.finish()) throw writingFailure(std::nullopt, _names.error());
 }
 
-void Split::evaluate(const XQuery& query, const XQueryConstants& constants) {
+void Split::evaluate(const XQuery& query, const XQueryVariables& constants) {
   XQueryStreamInput input;
-  input.beforeRecord = [this](size_t elementsKept) { _pieces.beginRecord(elementsKept); };
+  input.beforeRecord = [this](const NSXMLElement& record, size_t elementsKept) {
+    _pieces.beginRecord(record, elementsKept);
+  };
   const auto receive = [this](const Value& item) { return isDone([&] { _pieces.add(*item); }); };
   const auto failure = evaluateRecords(_options, query, constants, std::move(input), receive);
   if (_failure) throw *_failure;
@@ -118,7 +120,7 @@ void interpretSplit(Options& options) {
   options.stream = true;
 }
 
-Status runSplit(const Options& options, const XQuery& query, const XQueryConstants& constants,
+Status runSplit(const Options& options, const XQuery& query, const XQueryVariables& constants,
                 Phases& phases) {
   phases.evaluate.measure([&] {
     Split(options).run(query, constants);

@@ -16,6 +16,6 @@ void interpretSplit(Options& options);
 // The pieces are written one after the other. Each is whole when it gets its name, and is named on
 // standard output then; what a failure leaves unfinished is removed. Throws Failure.
 Status runSplit(const Options& options, const xquery::XQuery& query,
-                const xquery::XQueryConstants& constants, Phases& phases);
+                const xquery::XQueryVariables& constants, Phases& phases);
 
 }  // namespace cli

@@ -28,11 +28,11 @@ class Stream {
         _part(_results, 0),
         _writer(options, inputName(_path), _part) {}
 
-  Status run(const XQueryConstants& constants, Phases& phases);
+  Status run(const XQueryVariables& constants, Phases& phases);
 
  private:
   // None when all was read and written.
-  std::optional<Failure> evaluate(const XQueryConstants& constants);
+  std::optional<Failure> evaluate(const XQueryVariables& constants);
   bool receive(const Value& item);
   void beginOnce();
   std::string nameForReport() const;
@@ -47,11 +47,11 @@ class Stream {
   bool _hasBegun = false, _hasItems = false, _isTrue = false;
 };
 
-Status Stream::run(const XQueryConstants& constants, Phases& phases) {
+Status Stream::run(const XQueryVariables& constants, Phases& phases) {
   return finish(phases.evaluate.measure([&] { return evaluate(constants); }));
 }
 
-std::optional<Failure> Stream::evaluate(const XQueryConstants& constants) {
+std::optional<Failure> Stream::evaluate(const XQueryVariables& constants) {
   refuseOutputAsInput(_options, _path);
   XQueryStreamInput input;
   input.beforeWaiting = [this] { _results.flush(); };
@@ -107,7 +107,7 @@ void checkStream(const Options& options) {
 
 // The line of progress is gone when it ends.
 std::optional<Failure> evaluateRecords(const Options& options, const XQuery& query,
-                                       const XQueryConstants& constants, XQueryStreamInput input,
+                                       const XQueryVariables& constants, XQueryStreamInput input,
                                        const std::function<bool(const Value& item)>& receive) {
   const std::string& path = options.inputs.front();
   Evaluation evaluation(options, std::make_shared<MissingDocuments>(options));
@@ -132,7 +132,7 @@ std::optional<Failure> evaluateRecords(const Options& options, const XQuery& que
   return readingFailure(path, failure.reading);
 }
 
-Status runStream(const Options& options, const XQuery& query, const XQueryConstants& constants,
+Status runStream(const Options& options, const XQuery& query, const XQueryVariables& constants,
                  Phases& phases) {
   return Stream(options, query).run(constants, phases);
 }

@@ -1,11 +1,11 @@
 // Decimals beside a slow model, and how doubles print. The first line and the second are numbers as
 // text, of which the engine and the model take what they take for one; what is left says how to
 // round.
+#include "Platform/Numbers/NSDecimal.h"
 #include "Platform/Numbers/NumberText.h"
 #include "support/Failure.h"
 #include "support/Input.h"
 #include "support/SlowDecimal.h"
-#include "xquery/Number.h"
 
 #include <charconv>
 #include <cmath>

@@ -81,7 +81,7 @@ const XQuery& query() {
 }
 
 // Answers whether a limit was reached.
-bool isEvaluatedWithinLimits(const XQueryConstants& constants) {
+bool isEvaluatedWithinLimits(const XQueryVariables& constants) {
   const auto context = XQueryContext::xqueryContext();
   XQueryLimits limits;
   limits.duration = limit;
@@ -102,7 +102,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   const auto pattern = NSString::stringWithUTF8Replacing(input.line());
   const auto replacement = NSString::stringWithUTF8Replacing(input.line());
   const auto text = NSString::stringWithUTF8Replacing(input.rest());
-  const XQueryConstants constants = {{"s", text}, {"p", pattern}, {"r", replacement}, {"f", flags}};
+  const XQueryVariables constants = {{"s", text}, {"p", pattern}, {"r", replacement}, {"f", flags}};
   if (!isEvaluatedWithinLimits(constants)) return 0;
   const auto regEx = XQueryRegEx::regExp(pattern->view(), flags->view());
   if (regEx) checkPieces(*regEx, *text);

@@ -16,7 +16,8 @@
 //   25  Attribute name not distinct
 //   26  processing instruction content cannot contain ?>
 //   28  invalid node for document                    a second element, a text, a document
-//   44  Attribute namesapce is xmlns                 as a name of an element, too
+//   44  Attribute namesapce is xmlns                 an attribute with the name xmlns; the prefix
+//                                                    xmlns and its namespace, of elements as well
 //   70  invalid namespace declaration                a prefix without a URI or with one that is
 //                                                    reserved, or with two on one element
 //   72  invalid comment                              "--" in it, or "-" at its end
@@ -69,13 +70,14 @@ namespace xquery {
 [[nodiscard]] XQUERY_EXPORT XQueryResult<void> XQueryInsertChild(NSXMLNode& parent,
                                                                  const Ref<NSXMLNode>& child,
                                                                  uint32_t atIndex);
-// An attribute or a namespace, which has no parent. No two attributes of an element have one name
-// in one namespace.
+// An attribute or a namespace, which has no parent. The names of the attributes of an element
+// differ both as they are written and by namespace and local name.
 [[nodiscard]] XQUERY_EXPORT XQueryResult<void> XQueryAddAttribute(NSXMLElement& element,
                                                                   const Ref<NSXMLNode>& attribute);
 [[nodiscard]] XQUERY_EXPORT XQueryResult<void> XQueryAddNamespace(NSXMLElement& element,
                                                                   const Ref<NSXMLNode>& node);
-// Gives the attribute of that name and namespace the value, or adds one.
+// Gives the attribute with that local name in that namespace the value, whatever prefix it has, or
+// adds one.
 [[nodiscard]] XQUERY_EXPORT XQueryResult<void> XQuerySetAttribute(
     NSXMLElement& element, std::string_view name, std::string_view value,
     std::string_view namespaceURI = {});

@@ -68,17 +68,17 @@ class XQueryInput {
 // value. Against the context given, or one that is new and gone afterwards.
 [[nodiscard]] XQUERY_EXPORT XQueryResult<XQueryItemRange> XQueryEvaluate(
     const XQueryResult<Ref<XQuery>>& query, const XQueryInput& contextItem = {},
-    const XQueryConstants& variables = {}, const Ref<XQueryContext>& context = nullptr);
+    const XQueryVariables& variables = {}, const Ref<XQueryContext>& context = nullptr);
 // Of a query that is asked once.
 [[nodiscard]] XQUERY_EXPORT XQueryResult<XQueryItemRange> XQueryEvaluate(
     std::string_view source, const XQueryInput& contextItem = {},
-    const XQueryConstants& variables = {}, const Ref<XQueryContext>& context = nullptr);
+    const XQueryVariables& variables = {}, const Ref<XQueryContext>& context = nullptr);
 
 // As XQueryContext::evaluateStream, with a query that was compiled to be streamed. Items before the
 // error have been handed out.
 [[nodiscard]] XQUERY_EXPORT XQueryResult<void> XQueryEvaluateStream(
     const XQueryResult<Ref<XQuery>>& query, const XQueryStreamInput& input,
-    const XQueryContext::StreamReceiver& receive, const XQueryConstants& variables = {},
+    const XQueryContext::StreamReceiver& receive, const XQueryVariables& variables = {},
     const Ref<XQueryContext>& context = nullptr);
 
 }  // namespace xquery

@@ -63,7 +63,9 @@ enum class Kind : uint8_t {
   Query,
   Context,
 
-  // Objects that never are items. The engine tells its own classes apart by these.
+  // Objects that never are items: the library's own, which a host does not meet. They stand here
+  // since there is one set of numbers, so that a class is told by comparing one byte, and since the
+  // compiler sees that a switch over them is complete.
   Internal = 64,
   Prolog,
   Modules,
@@ -146,11 +148,27 @@ class NSObject {
   uint16_t _aux = 0;
 };
 
-// A heap object with a reference count. Created with a count of 0; the first `Ref` makes it 1.
+template <class T>
+class Ref;
+
+// A heap object with a reference count, which `Ref` keeps: created with a count of 0, which the
+// first `Ref` makes 1.
 class XQUERY_EXPORT NSCounted : public NSObject {
  public:
   static bool classof(const NSObject& object) { return !object.isNode(); }
 
+  // Blocks up to 128 bytes come from per-thread free lists.
+  static void* operator new(size_t size);
+  static void operator delete(void* block, size_t size) noexcept;
+
+ protected:
+  explicit NSCounted(Kind kind) : NSObject(kind) {}
+  virtual ~NSCounted() = default;
+
+ private:
+  static constexpr uint32_t immortalBit = 0x80000000U;
+
+  // In place here, since by calls copying a reference takes more than four times as long.
   void retain() const {
     const uint32_t count = __atomic_load_n(&_word, __ATOMIC_RELAXED);
     if (count & immortalBit) return;
@@ -177,26 +195,13 @@ class XQUERY_EXPORT NSCounted : public NSObject {
   // The retain of a reference to an object that no other thread can know yet.
   void retainNew() const { ++_word; }
 
-  // For shared singletons: from now on the object is never freed.
-  void makeImmortal() const { _word |= immortalBit; }
-  bool isImmortal() const { return (_word & immortalBit) != 0; }
-  // Whether nobody but the caller holds the object; what others did with it is done then.
-  bool hasOneReference() const { return __atomic_load_n(&_word, __ATOMIC_ACQUIRE) == 1; }
-
-  // Blocks up to 128 bytes come from per-thread free lists.
-  static void* operator new(size_t size);
-  static void operator delete(void* block, size_t size) noexcept;
-
- protected:
-  explicit NSCounted(Kind kind) : NSObject(kind) {}
-  virtual ~NSCounted() = default;
-
- private:
-  static constexpr uint32_t immortalBit = 0x80000000U;
-
   // Destruction never recurses deeply: past a fixed depth objects queue up and are destroyed in
   // turn, so that a chain of a million objects costs no stack.
   static void destroy(const NSCounted* object);
+
+  template <class T>
+  friend class Ref;
+  friend struct NSCounting;
 };
 
 class NSXMLNode;

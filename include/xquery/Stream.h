@@ -26,10 +26,11 @@ struct XQueryStreamInput {
   // Of a file, which may be a pipe: called where nothing can be read from it yet, before that is
   // waited for. Time to write what has been gathered; may be empty, must not throw.
   std::function<void()> beforeWaiting;
-  // Called before a record is evaluated, with the number of elements above it that are above the
-  // record before it as well, counted from the document element. From there on they are others,
-  // though they may look the same. May be empty, must not throw.
-  std::function<void(size_t elementsKept)> beforeRecord;
+  // Called before a record is evaluated, with the element that it is, which is good until the next
+  // call, and with the number of elements above it that are above the record before it as well,
+  // counted from the document element. From there on they are others, though they may look the
+  // same. May be empty, must not throw.
+  std::function<void(const NSXMLElement& record, size_t elementsKept)> beforeRecord;
 };
 
 // Why a stream ended before its end: one of the two is set.

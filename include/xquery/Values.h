@@ -1,6 +1,6 @@
 // Values of every type, from and to the types of C++.
 //
-//   XQueryConstants variables{{"limit", XQueryMakeInteger(20)},
+//   XQueryVariables variables{{"limit", XQueryMakeInteger(20)},
 //                             {"since", XQueryMakeDate(2026y / 11 / 23)}};
 //   for (const Value& item : XQueryItemRange(result)) {
 //     if (const auto count = XQueryReadInteger(item)) use(*count);
@@ -259,7 +259,8 @@ template <class Duration>
 // space around it is taken away, or made blanks, as XML Schema says of the type. Of a fraction of a
 // second the first nine digits count. Beside the forms of XML Schema the year 0000 and the form
 // "--05--" of a month are taken, since the language prints them. An anyURI must be one of RFC 3986.
-// "NOTATION" takes a lexical QName.
+// An NMTOKEN is made of the characters of an NCName, as the language has it: "a:b", which XML
+// Schema allows, is refused. "NOTATION" takes a lexical QName.
 //
 //   XQueryMakeFromText(XQueryItemType::Byte, "-128")
 //   XQueryMakeFromText(XQueryItemType::DateTime, "2026-11-23T09:05:00.25+01:00")

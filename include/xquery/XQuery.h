@@ -36,7 +36,7 @@ struct XQueryStreamInput;
 // NSArray of items, or the NSNull. The prefix is resolved in the query's prolog; no prefix means no
 // namespace. A name that does not resolve and a null value are passed over. Values are used as
 // given: a plain NSString, for example, is an xdt:untypedAtomic value.
-using XQueryConstants = std::map<std::string, Value>;
+using XQueryVariables = std::map<std::string, Value>;
 
 // Whether a compiled query is planned, so that it is evaluated with less work, or evaluated step by
 // step as it is written. Nobody can tell the two apart but by the time they take; the plain way is
@@ -173,7 +173,7 @@ class XQUERY_EXPORT XQueryClient {
 //
 //   auto context = XQueryContext::xqueryContext();
 //   Ref<XQueryError> error;
-//   auto items = context->evaluateXQuery(*query, {{"limit", XQueryUntypedAtomic("10")}}, document,
+//   auto items = context->evaluateXQuery(*query, {{"limit", XQueryMakeInteger(10)}}, document,
 //                                        &error);
 //   if (const auto failure = XQueryFirstError(items, error)) {
 //     report(failure->description()->utf8());
@@ -211,7 +211,7 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   // reached or the engine ran out of stack, memory or digits, or what an expression raised.
   //
   // A null or NSNull context item leaves the context item of an earlier evaluation in force.
-  [[nodiscard]] Ref<NSArray> evaluateXQuery(const XQuery& query, const XQueryConstants& constants,
+  [[nodiscard]] Ref<NSArray> evaluateXQuery(const XQuery& query, const XQueryVariables& constants,
                                             const Value& contextItem,
                                             Ref<XQueryError>* error = nullptr);
 
@@ -239,7 +239,7 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
   // True when the document has been read to its end, or as far as it was of use: what decides or
   // completes the result ends the reading, and so does the receiver. False with `failure`
   // otherwise; items before the failure have been handed out. `failure` is made empty first.
-  [[nodiscard]] bool evaluateStream(const XQuery& query, const XQueryConstants& constants,
+  [[nodiscard]] bool evaluateStream(const XQuery& query, const XQueryVariables& constants,
                                     const XQueryStreamInput& input, const StreamReceiver& receive,
                                     XQueryStreamFailure& failure);
 
@@ -276,7 +276,7 @@ class XQUERY_EXPORT XQueryContext : public NSCounted {
  private:
   void beginEvaluation(const XQueryInternal& compiled);
   void endEvaluation();
-  Value evaluateModule(const XQueryInternal& compiled, const XQueryConstants& constants,
+  Value evaluateModule(const XQueryInternal& compiled, const XQueryVariables& constants,
                        const std::function<Value()>& body);
   Ref<NSArray> shapedResult(const Value& result, Ref<XQueryError>* error);
   std::unique_ptr<XQueryContextInternal> _private;
@@ -310,8 +310,5 @@ XQUERY_EXPORT std::string XQueryItemTypeName(const NSObject& item);
 // The item's string value as UTF-8: a node's text, an atomic value's canonical form, the
 // hexadecimal digits of raw data, an error's description.
 XQUERY_EXPORT std::string XQueryItemStringValue(const NSObject& item);
-// An xdt:untypedAtomic value, as the command line binds its variables. Null when the text is not
-// UTF-8.
-[[nodiscard]] XQUERY_EXPORT Value XQueryUntypedAtomic(std::string_view utf8);
 
 }  // namespace xquery

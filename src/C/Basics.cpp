@@ -3,7 +3,7 @@
 
 #include "C/Handles.h"
 #include "Platform/Base/WorkMeter.h"
-#include "xquery/Error.h"
+#include "xquery/Exception.h"
 #include "xquery/Memory.h"
 
 #include <array>
@@ -11,6 +11,18 @@
 #include <stdexcept>
 
 namespace xquery::capi {
+
+namespace {
+
+// What ends the work of a query ends what is called meanwhile, too. Nothing else that a query may
+// fail with has a reason to arise where there is none.
+xq_status statusOf(const NSException& failure) noexcept {
+  const NSStringView reason = failure.reason() ? failure.reason()->view() : NSStringView();
+  if (reason == "limit: out of memory") return XQ_MEMORY;
+  return reason.startsWith(NSStringView::ascii("limit: ")) ? XQ_ERROR : XQ_INTERNAL;
+}
+
+}  // namespace
 
 xq_status statusOfFailure() noexcept {
   try {
@@ -21,8 +33,8 @@ xq_status statusOfFailure() noexcept {
     return XQ_MEMORY;
   } catch (const std::length_error&) {  // of a text or a list longer than any memory
     return XQ_MEMORY;
-  } catch (const NSException&) {  // of what a query could not have done either
-    return XQ_MISMATCH;
+  } catch (const NSException& failure) {
+    return statusOf(failure);
   } catch (...) {
     return XQ_INTERNAL;
   }

@@ -6,7 +6,7 @@
 #include "C/Options.h"
 #include "C/Texts.h"
 #include "C/Values.h"
-#include "xquery/Collection.h"
+#include "xquery/Values.h"
 
 #include <map>
 #include <string>
@@ -126,16 +126,17 @@ xq_status xq_context_set_options(xq_context* context, const xq_options* options)
 
 namespace {
 
-// Sets a variable to what `make` answers; a null one is text that is not UTF-8.
+// Sets a variable to what `make` puts into the value that it is given.
 template <class Make>
 xq_status setVariable(xq_context* context, const char* name, size_t length, Make make) {
   const GivenText given(name, length);
   if (!given.isGood()) return XQ_USAGE;
-  return changeContext(context, [&](xq_context& changed) {
-    Value value = make();
-    if (!value || !given.string()) return XQ_INPUT;
-    changed.variables[std::string(given.view())] = std::move(value);
-    return XQ_OK;
+  return changeContext(context, [&](xq_context& changed) -> xq_status {
+    if (!given.string()) return XQ_INPUT;
+    Value value;
+    const xq_status status = make(value);
+    if (status == XQ_OK) changed.variables[std::string(given.view())] = std::move(value);
+    return status;
   });
 }
 
@@ -144,20 +145,30 @@ xq_status setVariable(xq_context* context, const char* name, size_t length, Make
 xq_status xq_context_set_variable(xq_context* context, const char* name, size_t length,
                                   const xq_value* value) {
   if (!areGood(value)) return XQ_USAGE;
-  return setVariable(context, name, length, [&] { return asOneValue(*value); });
+  return setVariable(context, name, length, [&](Value& made) {
+    made = asOneValue(*value);
+    return XQ_OK;
+  });
 }
 
 xq_status xq_context_set_variable_text(xq_context* context, const char* name, size_t length,
                                        const char* text, size_t text_length) {
   const GivenText given(text, text_length);
   if (!given.isGood()) return XQ_USAGE;
-  return setVariable(context, name, length, [&]() -> Value { return given.string(); });
+  return setVariable(context, name, length, [&](Value& made) {
+    if (!given.string()) return XQ_INPUT;
+    made = XQueryMakeUntypedAtomic(given.view()).valueOr(nullptr);
+    return made ? XQ_OK : XQ_MISMATCH;
+  });
 }
 
 xq_status xq_context_set_variable_node(xq_context* context, const char* name, size_t length,
                                        const xq_node* node) {
   if (!areGood(node)) return XQ_USAGE;
-  return setVariable(context, name, length, [&]() -> Value { return node->node; });
+  return setVariable(context, name, length, [&](Value& made) {
+    made = node->node;
+    return XQ_OK;
+  });
 }
 
 xq_status xq_context_clear_variables(xq_context* context) {

@@ -20,7 +20,7 @@ struct xq_context : xquery::capi::Handle<xquery::capi::Tag::Context> {
 
   const xquery::Ref<xquery::XQueryContext> context;
   const std::shared_ptr<xquery::capi::Client> client;
-  xquery::XQueryConstants variables;
+  xquery::XQueryVariables variables;
   xquery::Value item;
   // Whether a call is under way: of this thread, in one of whose callbacks the host is, or of
   // another one, which must not be.

@@ -44,9 +44,13 @@ xq_status readDocumentBy(xq_reading flags, xq_node** document, xq_error** error,
   *document = nullptr;
   if (!isUsable || !areReadingFlags(flags)) return XQ_USAGE;
   return guarded([&] {
-    NSXMLParseError failure;
-    const Ref<NSXMLDocument> found = read(readingOptions(flags), failure);
-    return found ? giveNew(document, found) : giveError(error, failure);
+    try {
+      NSXMLParseError failure;
+      const Ref<NSXMLDocument> found = read(readingOptions(flags), failure);
+      return found ? giveNew(document, found) : giveError(error, failure);
+    } catch (const NSException& limit) {
+      return giveOuterLimit(error, limit);
+    }
   });
 }
 

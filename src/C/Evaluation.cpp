@@ -5,6 +5,7 @@
 #include "C/Queries.h"
 #include "C/Texts.h"
 #include "C/Values.h"
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/WorkMeter.h"
 #include "xquery/Collection.h"
 #include "xquery/Stream.h"
@@ -19,7 +20,7 @@ namespace {
 // The items of a result that nobody else holds are taken over.
 std::vector<Value> itemsOf(const Ref<NSArray>& result) {
   if (!result) return {};
-  if (result->hasOneReference()) return std::move(result->objects());
+  if (NSCounting::hasOneReference(*result)) return std::move(result->objects());
   return result->objects();
 }
 

@@ -81,7 +81,7 @@ class ImportedVariables {
 
 }  // namespace
 
-void XQuerySetConstants(const XQueryConstants& constants, const XQueryProlog& prolog,
+void XQuerySetConstants(const XQueryVariables& constants, const XQueryProlog& prolog,
                         XQueryContext& context) {
   for (const auto& [name, value] : constants) {
     const auto text = NSString::stringWithUTF8(name);

@@ -9,7 +9,7 @@ class XQueryProlog;
 
 // Makes each constant a global of the name that its key stands for in the prolog. A key that is not
 // UTF-8 or does not resolve is skipped, and so is one without a value; values are taken as given.
-void XQuerySetConstants(const XQueryConstants& constants, const XQueryProlog& prolog,
+void XQuerySetConstants(const XQueryVariables& constants, const XQueryProlog& prolog,
                         XQueryContext& context);
 
 // Gives every variable that the prolog declares or imported its value, the imported ones first,

@@ -59,7 +59,7 @@ XQueryResult<Ref<XQuery>> XQueryCompile(std::string_view source, const XQueryLoa
 
 XQueryResult<XQueryItemRange> XQueryEvaluate(const XQueryResult<Ref<XQuery>>& query,
                                              const XQueryInput& contextItem,
-                                             const XQueryConstants& variables,
+                                             const XQueryVariables& variables,
                                              const Ref<XQueryContext>& context) {
   if (contextItem.error()) return contextItem.error();
   if (!query) return query.error();
@@ -72,7 +72,7 @@ XQueryResult<XQueryItemRange> XQueryEvaluate(const XQueryResult<Ref<XQuery>>& qu
 
 XQueryResult<XQueryItemRange> XQueryEvaluate(std::string_view source,
                                              const XQueryInput& contextItem,
-                                             const XQueryConstants& variables,
+                                             const XQueryVariables& variables,
                                              const Ref<XQueryContext>& context) {
   return XQueryEvaluate(XQueryCompile(source), contextItem, variables, context);
 }
@@ -80,7 +80,7 @@ XQueryResult<XQueryItemRange> XQueryEvaluate(std::string_view source,
 XQueryResult<void> XQueryEvaluateStream(const XQueryResult<Ref<XQuery>>& query,
                                         const XQueryStreamInput& input,
                                         const XQueryContext::StreamReceiver& receive,
-                                        const XQueryConstants& variables,
+                                        const XQueryVariables& variables,
                                         const Ref<XQueryContext>& context) {
   if (!query) return query.error();
   XQueryStreamFailure failure;

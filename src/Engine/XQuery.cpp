@@ -255,7 +255,7 @@ class Profiling {
 
 }  // namespace
 
-Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryConstants& constants,
+Ref<NSArray> XQueryContext::evaluateXQuery(const XQuery& query, const XQueryVariables& constants,
                                            const Value& contextItem, Ref<XQueryError>* error) {
   const XQueryInternal& compiled = _internal(query);
   if (error) *error = nullptr;
@@ -301,7 +301,7 @@ Ref<XQueryError> tracedError(const XQueryContextInternal& context, const Ref<XQu
 }
 
 // The trees that come in from the host may be in use by other threads.
-void takeCredit(const Value& contextItem, const XQueryConstants& constants) {
+void takeCredit(const Value& contextItem, const XQueryVariables& constants) {
   constexpr size_t mostItems = 16;  // of a list; there is no room for many trees
   const auto take = [](const NSObject* item) {
     if (const auto* node = dyn_cast<NSXMLNode>(item)) NSXMLCredit::take(node);
@@ -320,7 +320,7 @@ void takeCredit(const Value& contextItem, const XQueryConstants& constants) {
 
 // What the body answers, or the error that ended the evaluation.
 Value XQueryContext::evaluateModule(const XQueryInternal& compiled,
-                                    const XQueryConstants& constants,
+                                    const XQueryVariables& constants,
                                     const std::function<Value()>& body) {
   XQueryLimitWatch watch(*this);
   const Value contextItem = _private->contextItem();

@@ -1,5 +1,6 @@
 #include "Expr/LiteralCopies.h"
 
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Tree/Credit.h"
 #include "Types/XQueryDate.h"
@@ -35,7 +36,7 @@ uint32_t XQueryLiteralCopies::placeOf(const NSObject* stored) {
   if (!stored) return anyPlace;
   if (stored->isNode()) return inTree;
   const bool isCopied = isa<XQueryNumber>(stored) || isa<XQueryDate>(stored) || isShortText(stored);
-  return isCopied && !cast<NSCounted>(stored)->isImmortal() ? threadPlace() : anyPlace;
+  return isCopied && !NSCounting::isImmortal(*cast<NSCounted>(stored)) ? threadPlace() : anyPlace;
 }
 
 XQueryLiteralCopies::XQueryLiteralCopies(Value stored)
@@ -46,7 +47,7 @@ XQueryLiteralCopies::~XQueryLiteralCopies() {
   if (!places) return;
   for (uint32_t place = 0; place < threadPlaceCount(); ++place) {
     NSObject* copy = places[place].load(std::memory_order_acquire);
-    if (copy) cast<NSCounted>(copy)->release();
+    if (copy) NSCounting::release(*cast<NSCounted>(copy));
   }
 }
 

@@ -1,6 +1,7 @@
 #include "Expr/XQueryLeaves.h"
 
 #include "Context/XQueryContextInternal.h"
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Numbers/NumberText.h"
 #include "Prolog/XQueryProlog.h"
@@ -78,7 +79,7 @@ XQueryContextItem* XQueryContextItem::contextItem() {
   static XQueryContextItem* const shared = [] {
     const LastingObjects lasting;
     auto* item = new XQueryContextItem();
-    item->makeImmortal();
+    NSCounting::makeImmortal(*item);
     return item;
   }();
   return shared;

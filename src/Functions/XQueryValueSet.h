@@ -18,7 +18,7 @@
 #pragma once
 
 #include "Functions/FlatSet.h"
-#include "xquery/Number.h"
+#include "Platform/Numbers/NSDecimal.h"
 #include "xquery/Object.h"
 #include "xquery/String.h"
 

@@ -1,5 +1,6 @@
 #include "Prolog/XQueryModules.h"
 
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Prolog/XQueryProlog.h"
 
@@ -32,7 +33,7 @@ BuiltinNamespaces makeBuiltinNamespaces() {
   BuiltinNamespaces namespaces;
   for (size_t id = 1; id < builtinURIs.size(); ++id) {
     namespaces[id] = NSString::stringWithASCII(builtinURIs[id]);
-    namespaces[id]->makeImmortal();
+    NSCounting::makeImmortal(*namespaces[id]);
   }
   return namespaces;
 }

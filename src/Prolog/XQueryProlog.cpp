@@ -3,6 +3,7 @@
 // stands for which ID.
 #include "Prolog/XQueryProlog.h"
 
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Base/XQueryErrorTrace.h"
@@ -50,7 +51,7 @@ PrefixSlots makePredeclaredSlots() {
   slots[0] = slots[1] = NSNull::null();
   for (size_t index = 0; index < predeclaredPrefixes.size(); ++index) {
     auto prefix = NSString::stringWithASCII(predeclaredPrefixes[index].prefix);
-    prefix->makeImmortal();
+    NSCounting::makeImmortal(*prefix);
     slots[index + 2] = prefix;
   }
   return slots;

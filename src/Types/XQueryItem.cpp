@@ -24,8 +24,4 @@ std::string XQueryItemStringValue(const NSObject& item) {
   return text ? text->utf8() : std::string();
 }
 
-Value XQueryUntypedAtomic(std::string_view utf8) {
-  return NSString::stringWithUTF8(utf8);
-}
-
 }  // namespace xquery

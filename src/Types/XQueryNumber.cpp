@@ -1,6 +1,7 @@
 // Making typed numbers and printing them.
 #include "Types/XQueryNumber.h"
 
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Numbers/NumberText.h"
 #include "Types/DurationReader.h"
@@ -57,7 +58,7 @@ template <class Number>
 XQueryNumber* sharedDouble(Number value) {
   const LastingObjects lasting;
   auto number = make<XQueryNumber>(XQueryTypeDouble, std::move(value));
-  number->makeImmortal();
+  NSCounting::makeImmortal(*number);
   return number.detach();
 }
 

@@ -1,8 +1,8 @@
 // Typed numbers: every numeric type, and the two ordered durations as counts of months and seconds.
 #pragma once
 
+#include "Platform/Numbers/NSDecimal.h"
 #include "Types/XQueryTypeTable.h"
-#include "xquery/Number.h"
 
 namespace xquery {
 

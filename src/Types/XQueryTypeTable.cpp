@@ -5,6 +5,7 @@
 // `derives`, which also answers for numbers that are no type.
 #include "Types/XQueryTypeTable.h"
 
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Types/SafeNSArrayAdd.h"
 #include "Types/XQueryDate.h"
@@ -134,7 +135,7 @@ constexpr std::array<uint64_t, typeCount> kindMasks = makeKindMasks();
 
 Ref<NSString> immortalText(const char* text) {
   Ref<NSString> string = NSString::stringWithASCII(text);
-  string->makeImmortal();
+  NSCounting::makeImmortal(*string);
   return string;
 }
 
@@ -152,7 +153,7 @@ struct TypeTables {
     for (const TypeName& row : typeNames) {
       const Ref<NSString>& URI = row.namespaceURI == xsNamespace ? xs : xdt;
       Ref<XQueryQName> name = XQueryQName::qnameWithLocalPart(immortalText(row.localName), URI);
-      name->makeImmortal();
+      NSCounting::makeImmortal(*name);
       sXQueryNameIDMappings.emplace(name, row.id);
       SafeNSArrayAdd(sXQueryTypeNames, name, static_cast<size_t>(row.id));
     }

@@ -63,6 +63,9 @@ static void variables_are_texts_and_nodes(void) {
   check_evaluation(context, "declare variable $v external; string($v/a)", "n");
   CHECK_STATUS(xq_context_set_variable_text(context, "v", 1, "\xFF", 1), XQ_INPUT);
   CHECK_STATUS(xq_context_set_variable_text(context, "\xFF", 1, "a", 1), XQ_INPUT);
+  CHECK_STATUS(xq_context_set_variable_text(context, "v", 1, "a\0b", 3), XQ_MISMATCH);
+  CHECK_STATUS(xq_context_set_variable_text(context, "v", 1, "\1", 1), XQ_MISMATCH);
+  CHECK_STATUS(xq_context_set_variable_text(context, "v", 1, "\1\xFF", 2), XQ_INPUT);
   CHECK_STATUS(xq_context_set_variable_text(context, "v", 1, NULL, 1), XQ_USAGE);
   CHECK_STATUS(xq_context_set_variable_text(context, NULL, 1, "a", 1), XQ_USAGE);
   CHECK_STATUS(xq_context_set_variable_node(context, "v", 1, NULL), XQ_USAGE);

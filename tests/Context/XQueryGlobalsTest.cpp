@@ -42,12 +42,12 @@ class Globals : public testing::Test {
     items.insert(items.begin(), moduleNamespace(prefix, "urn:" + std::string(prefix)));
     return prologOf(items, modules);
   }
-  void evaluate(const XQueryProlog& prolog, const XQueryConstants& constants = {}) {
+  void evaluate(const XQueryProlog& prolog, const XQueryVariables& constants = {}) {
     XQuerySetConstants(constants, prolog, *context);
     XQueryEvaluateDeclarations(prolog, *context);
   }
   // "number: message" of the error that is raised.
-  std::string failure(const XQueryProlog& prolog, const XQueryConstants& constants = {}) {
+  std::string failure(const XQueryProlog& prolog, const XQueryVariables& constants = {}) {
     try {
       evaluate(prolog, constants);
     } catch (const NSException&) {

@@ -132,8 +132,8 @@ TEST(Concurrency, ConstantsAreShared) {
       "declare variable $all external; declare variable $n external; "
       "sum($all) + $n, count($all[. > $n]), <e>{$all}</e>, $all[3]");
   std::vector<Value> numbers;
-  for (int i = 0; i < 50; ++i) numbers.push_back(XQueryUntypedAtomic(std::to_string(i)));
-  const XQueryConstants constants = {{"all", NSArray::arrayWithObjects(numbers)},
+  for (int i = 0; i < 50; ++i) numbers.push_back(NSString::stringWithUTF8(std::to_string(i)));
+  const XQueryVariables constants = {{"all", NSArray::arrayWithObjects(numbers)},
                                      {"n", NSNumber::numberWithLongLong(10)}};
   const std::string expected = evaluated(*query, nullptr, constants);
   EXPECT_EQ(together([&](int, Complaints& complaints) {
@@ -154,7 +154,7 @@ TEST(Concurrency, ConstantNodesAreShared) {
   const auto element = NSXMLElement::elementWithName(NSStringView::ascii("n"));
   element->addChild(NSXMLElement::elementWithName(NSStringView::ascii("m")));
   const Ref<NSXMLNode> comment = NSXMLNode::commentWithStringValue(NSStringView::ascii("c"));
-  const XQueryConstants constants = {{"n", NSArray::arrayWithObjects({element, comment})}};
+  const XQueryVariables constants = {{"n", NSArray::arrayWithObjects({element, comment})}};
   const std::string expected = evaluated(*query, element->copy(), constants);
   EXPECT_EQ(expected.find("error"), std::string::npos) << expected;
   EXPECT_EQ(together([&](int, Complaints& complaints) {

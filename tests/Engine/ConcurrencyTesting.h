@@ -89,13 +89,13 @@ inline Ref<XQueryContext> newContext() {
 }
 
 inline std::string evaluated(XQueryContext& context, const XQuery& query, const Value& item,
-                             const XQueryConstants& constants = {}) {
+                             const XQueryVariables& constants = {}) {
   Ref<XQueryError> error;
   const auto items = context.evaluateXQuery(query, constants, item, &error);
   return printed(items, error);
 }
 inline std::string evaluated(const XQuery& query, const Value& item,
-                             const XQueryConstants& constants = {}) {
+                             const XQueryVariables& constants = {}) {
   return evaluated(*newContext(), query, item, constants);
 }
 

@@ -112,8 +112,8 @@ TEST_F(Embedding, AnyNodeMayBeTheContextItem) {
 }
 
 TEST_F(Embedding, AnAtomicValueMayBeTheContextItem) {
-  EXPECT_EQ(strings(evaluate(". + 1", {}, XQueryUntypedAtomic("41"))), "42");
-  EXPECT_FALSE(evaluate("/a", {}, XQueryUntypedAtomic("x")));
+  EXPECT_EQ(strings(evaluate(". + 1", {}, NSString::stringWithUTF8("41"))), "42");
+  EXPECT_FALSE(evaluate("/a", {}, NSString::stringWithUTF8("x")));
   EXPECT_EQ(failure(), "20 context item not a node");
   EXPECT_FALSE(evaluate("//x"));
   EXPECT_EQ(failure(), "20 context item not a node");
@@ -189,9 +189,9 @@ TEST_F(Embedding, ItemTypesAreNamedAsAQueryWritesThem) {
   EXPECT_EQ(types(evaluate("/, /r/a, /r/@k, /r/text(), /r/comment(), /r/processing-instruction()",
                            {}, document)),
             "document-node() element() attribute() text() comment() processing-instruction()");
-  EXPECT_EQ(
-      types(evaluate("1, 1.5, 1e0, 'x', 1 = 1, 1 div 2, $u", {{"u", XQueryUntypedAtomic("")}})),
-      "xs:integer xs:decimal xs:double xs:string xs:boolean xs:decimal xdt:untypedAtomic");
+  EXPECT_EQ(types(evaluate("1, 1.5, 1e0, 'x', 1 = 1, 1 div 2, $u",
+                           {{"u", NSString::stringWithUTF8("")}})),
+            "xs:integer xs:decimal xs:double xs:string xs:boolean xs:decimal xdt:untypedAtomic");
 }
 
 // --- constants -----------------------------------------------------------------------------------
@@ -221,14 +221,15 @@ TEST_F(Embedding, ConstantsMayBeNodesAndDocuments) {
 }
 
 TEST_F(Embedding, ConstantsMayBeSequences) {
-  const auto three = NSArray::arrayWithObjects(
-      {XQueryUntypedAtomic("1"), XQueryUntypedAtomic("2"), NSNumber::numberWithDouble(3)});
+  const auto three =
+      NSArray::arrayWithObjects({NSString::stringWithUTF8("1"), NSString::stringWithUTF8("2"),
+                                 NSNumber::numberWithDouble(3)});
   EXPECT_EQ(strings(evaluate("$v[2], $v[3] + 1, ($v, 9)", {{"v", three}})), "2 4 1 2 3 9");
   EXPECT_EQ(strings(evaluate("$v = 3, $v = 4", {{"v", three}})), "true false");
 }
 
 TEST_F(Embedding, AnArrayOfOneItemIsThatItem) {
-  const auto one = NSArray::arrayWithObjects({XQueryUntypedAtomic("4")});
+  const auto one = NSArray::arrayWithObjects({NSString::stringWithUTF8("4")});
   EXPECT_EQ(strings(evaluate("$v + 1, -$v, $v eq '4', $v to 5, $v[1]", {{"v", one}})),
             "5 -4 true 4 5 4");
 }
@@ -246,33 +247,33 @@ TEST_F(Embedding, AnEmptyArrayAndTheNullObjectAreTheEmptySequence) {
 
 TEST_F(Embedding, ConstantsLastForOneEvaluation) {
   const auto query = XQuery::xqueryWithSource("declare variable $v external; $v");
-  EXPECT_EQ(
-      strings(context->evaluateXQuery(*query, {{"v", XQueryUntypedAtomic("1")}}, nullptr, &error)),
-      "1");
+  EXPECT_EQ(strings(context->evaluateXQuery(*query, {{"v", NSString::stringWithUTF8("1")}}, nullptr,
+                                            &error)),
+            "1");
   EXPECT_FALSE(context->evaluateXQuery(*query, {}, nullptr, &error));
   EXPECT_EQ(failure(), "16 unresloved external variable - v");
-  EXPECT_EQ(
-      strings(context->evaluateXQuery(*query, {{"v", XQueryUntypedAtomic("2")}}, nullptr, &error)),
-      "2");
+  EXPECT_EQ(strings(context->evaluateXQuery(*query, {{"v", NSString::stringWithUTF8("2")}}, nullptr,
+                                            &error)),
+            "2");
 }
 
 TEST_F(Embedding, ConstantsAreClearedAfterAFailureToo) {
-  EXPECT_FALSE(evaluate("$v + 'x'", {{"v", XQueryUntypedAtomic("1")}}));
+  EXPECT_FALSE(evaluate("$v + 'x'", {{"v", NSString::stringWithUTF8("1")}}));
   EXPECT_FALSE(evaluate("$v"));
   EXPECT_EQ(failure(), "8 reference to undefined variable \"v\"");
 }
 
 TEST_F(Embedding, ConstantNamesAreResolvedInTheQuery) {
-  const XQueryConstants constants = {{"p:v", XQueryUntypedAtomic("1")},
-                                     {"q:v", XQueryUntypedAtomic("2")},
-                                     {"v", XQueryUntypedAtomic("3")}};
+  const XQueryVariables constants = {{"p:v", NSString::stringWithUTF8("1")},
+                                     {"q:v", NSString::stringWithUTF8("2")},
+                                     {"v", NSString::stringWithUTF8("3")}};
   EXPECT_EQ(strings(evaluate("declare namespace p = 'urn:p'; $p:v, $v", constants)), "1 3");
   EXPECT_EQ(strings(evaluate("declare namespace q = 'urn:p'; $q:v, $v", constants)), "2 3");
   EXPECT_EQ(strings(evaluate("$v", constants)), "3");
 }
 
 TEST_F(Embedding, NodesOfDifferentDocuments) {
-  const XQueryConstants constants = {{"a", parse("<r n='a'/>")}, {"b", parse("<r n='b'/>")}};
+  const XQueryVariables constants = {{"a", parse("<r n='a'/>")}, {"b", parse("<r n='b'/>")}};
   EXPECT_EQ(strings(evaluate("$a/r << $b/r, $b/r << $a/r, $a/r >> $b/r, $a/r is $b/r", constants)),
             "false false false false");
   EXPECT_EQ(strings(evaluate("$a << $b/r, $b/r << $a", constants)), "true false");
@@ -280,7 +281,7 @@ TEST_F(Embedding, NodesOfDifferentDocuments) {
 }
 
 TEST_F(Embedding, SetsOfSeveralDocumentsKeepTheDocumentsInTheirOrder) {
-  const XQueryConstants constants = {{"a", parse("<r><x>a1</x><x>a2</x></r>")},
+  const XQueryVariables constants = {{"a", parse("<r><x>a1</x><x>a2</x></r>")},
                                      {"b", parse("<r><x>b1</x><x>b2</x></r>")}};
   EXPECT_EQ(strings(evaluate("$a/r/x union $b/r/x", constants)), "a1 a2 b1 b2");
   EXPECT_EQ(strings(evaluate("$b/r/x union $a/r/x", constants)), "b1 b2 a1 a2");
@@ -337,7 +338,8 @@ TEST_F(Embedding, ContextNamespacesServeOneContextOnly) {
 TEST_F(Embedding, ContextNamespacesDoNotNameVariables) {
   const auto own = XQueryContext::xqueryContextWithNamespaces({{"p", "urn:p"}});
   const auto query = XQuery::xqueryWithSource("$p:v");
-  EXPECT_FALSE(own->evaluateXQuery(*query, {{"p:v", XQueryUntypedAtomic("1")}}, nullptr, &error));
+  EXPECT_FALSE(
+      own->evaluateXQuery(*query, {{"p:v", NSString::stringWithUTF8("1")}}, nullptr, &error));
   EXPECT_EQ(failure(), "8 reference to undefined variable \"p:v\"");
 }
 
@@ -356,8 +358,8 @@ TEST_F(Embedding, TheClientHearsTraces) {
   const auto client = std::make_shared<Listener>();
   context->contextSetClient(client);
   EXPECT_EQ(context->contextClient(), client);
-  _traceValue(*context, XQueryUntypedAtomic("1"), NSString::stringWithASCII("a"));
-  _traceValue(*context, XQueryUntypedAtomic("2"), NSString::stringWithASCII("b"));
+  _traceValue(*context, NSString::stringWithUTF8("1"), NSString::stringWithASCII("a"));
+  _traceValue(*context, NSString::stringWithUTF8("2"), NSString::stringWithASCII("b"));
   EXPECT_EQ(client->heard, "a=1;b=2;");
   EXPECT_EQ(client->from, context.get());
 }
@@ -369,17 +371,17 @@ TEST_F(Embedding, TheClientStaysUntilAnotherTakesItsPlace) {
   EXPECT_EQ(strings(evaluate("1")), "1");
   EXPECT_EQ(context->contextClient(), first);
   context->contextSetClient(second);
-  _traceValue(*context, XQueryUntypedAtomic("1"), NSString::stringWithASCII("a"));
+  _traceValue(*context, NSString::stringWithUTF8("1"), NSString::stringWithASCII("a"));
   EXPECT_EQ(first->heard, "");
   EXPECT_EQ(second->heard, "a=1;");
   context->contextSetClient(nullptr);
   EXPECT_FALSE(context->contextClient());
-  _traceValue(*context, XQueryUntypedAtomic("1"), NSString::stringWithASCII("a"));
+  _traceValue(*context, NSString::stringWithUTF8("1"), NSString::stringWithASCII("a"));
   EXPECT_EQ(second->heard, "a=1;");
 }
 
 TEST_F(Embedding, TwoEntryPointsDoNothing) {
-  context->addXQueryProlog(XQueryUntypedAtomic("declare variable $v := 1;"));
+  context->addXQueryProlog(NSString::stringWithUTF8("declare variable $v := 1;"));
   context->addXQueryProlog(nullptr);
   context->contextAddClientSelector("f:", "f");
   EXPECT_EQ(strings(evaluate("1 + 1")), "2");
@@ -483,7 +485,7 @@ TEST_F(Embedding, ThreadsShareOneDocumentAndOneQuery) {
   const Value document = parse(bigDocument(500));
   const auto query = XQuery::xqueryWithSource(
       "declare variable $k external; //a[b = $k]/@n, (//a[3], //a[2]) union //a[1], 10 to 12");
-  const XQueryConstants constants = {{"k", NSNumber::numberWithDouble(3)}};
+  const XQueryVariables constants = {{"k", NSNumber::numberWithDouble(3)}};
   const auto expected = context->evaluateXQuery(*query, constants, document, &error);
   ASSERT_TRUE(expected);
   std::atomic<int> wrong{0};

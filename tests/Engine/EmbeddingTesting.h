@@ -30,7 +30,7 @@ inline std::string strings(const Ref<NSArray>& items) {
 
 class Embedding : public testing::Test {
  protected:
-  Ref<NSArray> evaluate(std::string_view source, const XQueryConstants& constants = {},
+  Ref<NSArray> evaluate(std::string_view source, const XQueryVariables& constants = {},
                         const Value& item = Value()) {
     const auto query = XQuery::xqueryWithSource(source);
     return context->evaluateXQuery(*query, constants, item, &error);

@@ -56,7 +56,7 @@ TEST_F(FirstError, GoesBeforeTheItems) {
 
 TEST_F(FirstError, MayBeOneThatIsNotTheEnginesOwn) {
   const auto foreign = NSError::errorWithDomain("host", 7, "of the host's own");
-  const auto array = NSArray::arrayWithObjects({XQueryUntypedAtomic("a"), foreign});
+  const auto array = NSArray::arrayWithObjects({NSString::stringWithUTF8("a"), foreign});
   EXPECT_EQ(XQueryFirstError(array), foreign);
 }
 

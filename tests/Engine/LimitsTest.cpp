@@ -517,7 +517,7 @@ TEST(Limits, AnErrorOfTheQueryIsNoneHoweverItBegins) {
 
 TEST(Limits, LeaveTheFocusAsItWasBefore) {
   const auto context = XQueryContext::xqueryContext();
-  _internal(*context).setContextItem(XQueryUntypedAtomic("kept"), 3);
+  _internal(*context).setContextItem(NSString::stringWithUTF8("kept"), 3);
   XQueryLimits limits;
   limits.duration = milliseconds(20);
   context->contextSetLimits(limits);

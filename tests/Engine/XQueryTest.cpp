@@ -42,7 +42,7 @@ using Items = std::vector<Ref<XQueryPrologItem>>;
 class Driver : public testing::Test {
  protected:
   // Evaluates; the error, if any, is left in `error`.
-  Ref<NSArray> evaluate(std::string_view source, const XQueryConstants& constants = {},
+  Ref<NSArray> evaluate(std::string_view source, const XQueryVariables& constants = {},
                         const Value& item = Value()) {
     query = XQuery::xqueryWithSource(source);
     return context->evaluateXQuery(*query, constants, item, &error);

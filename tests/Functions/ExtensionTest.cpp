@@ -20,7 +20,7 @@ struct Outcome {
   std::string text;
   double seconds;  // of the processor
 };
-Outcome outcome(std::string_view source, const Value& item, const XQueryConstants& constants,
+Outcome outcome(std::string_view source, const Value& item, const XQueryVariables& constants,
                 XQueryContext& context) {
   const Ref<XQuery> query = XQuery::xqueryWithSource(source);
   Ref<XQueryError> error;

@@ -56,7 +56,7 @@ inline std::string refusedCounts(XQueryProcedure procedure, const Value& argumen
 
 // The items of the result as `show` prints them, separated by ", "; or "error 17 line 1 message".
 inline std::string answer(std::string_view query, const Value& contextItem = Value(),
-                          const XQueryConstants& constants = {}) {
+                          const XQueryVariables& constants = {}) {
   const Ref<XQuery> compiled = XQuery::xqueryWithSource(query);
   const Ref<XQueryContext> context = XQueryContext::xqueryContext();
   Ref<XQueryError> error;

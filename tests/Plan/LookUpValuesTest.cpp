@@ -37,7 +37,7 @@ const Value& shelf() {
 }
 
 // Evaluated so often that an index that is of use is there in the end.
-std::vector<std::string> resultOf(std::string_view text, const XQueryConstants& constants = {}) {
+std::vector<std::string> resultOf(std::string_view text, const XQueryVariables& constants = {}) {
   const Outcome plain = outcomeOf(*compiled(text), shelf(), constants);
   const auto planned = compiled(text, XQueryWay::Planned);
   for (int i = 0; i < 3; ++i) {
@@ -321,11 +321,11 @@ TEST(LookUpValues, FindTextsAndLeaveOtherValuesToWalking) {
 
 TEST(LookUpValues, TakeProbesFromTheHost) {
   const char* text = "declare variable $id external; (/r/e[@id = $id], //e[k = $id])/@id";
-  XQueryConstants constants;
+  XQueryVariables constants;
   for (const char* id : {"e7", "k3", "nobody"}) {
     constants["id"] = NSString::stringWithUTF8(id);
     resultOf(text, constants);
-    constants["id"] = XQueryUntypedAtomic(id);
+    constants["id"] = NSString::stringWithUTF8(id);
     resultOf(text, constants);
   }
   constants["id"] = NSNumber::numberWithLongLong(7);

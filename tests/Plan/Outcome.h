@@ -30,7 +30,7 @@ inline std::string shownItem(const NSObject& item) {
 }
 
 inline Outcome outcomeIn(XQueryContext& context, const XQuery& query, const Value& contextItem,
-                         const XQueryConstants& constants = {}) {
+                         const XQueryVariables& constants = {}) {
   Outcome outcome;
   Ref<XQueryError> error;
   const auto items = context.evaluateXQuery(query, constants, contextItem, &error);
@@ -59,7 +59,7 @@ inline Outcome outcomeIn(XQueryContext& context, const XQuery& query, const Valu
 
 // In a context of its own.
 inline Outcome outcomeOf(const XQuery& query, const Value& contextItem,
-                         const XQueryConstants& constants = {}, const XQueryLimits& limits = {}) {
+                         const XQueryVariables& constants = {}, const XQueryLimits& limits = {}) {
   const auto context = XQueryContext::xqueryContext();
   context->contextSetLimits(limits);
   return outcomeIn(*context, query, contextItem, constants);

@@ -11,7 +11,7 @@
 namespace xquery::plantest {
 
 inline std::string plainAnswer(std::string_view query, const Value& contextItem = Value(),
-                               const XQueryConstants& constants = {}) {
+                               const XQueryVariables& constants = {}) {
   ::setenv("XQUERY_PLAN", "0", 1);
   std::string text = functiontest::answer(query, contextItem, constants);
   ::unsetenv("XQUERY_PLAN");

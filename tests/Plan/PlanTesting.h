@@ -126,7 +126,7 @@ inline Value document(std::string_view xml) {
 
 // Both ways agree. Answers what they come to.
 inline Outcome sameBothWays(std::string_view text, const Value& contextItem = {},
-                            const XQueryConstants& constants = {}) {
+                            const XQueryVariables& constants = {}) {
   const Outcome plain = outcomeOf(*compiled(text), contextItem, constants);
   const Outcome planned = outcomeOf(*compiled(text, XQueryWay::Planned), contextItem, constants);
   EXPECT_EQ(plain.lines, planned.lines) << text;

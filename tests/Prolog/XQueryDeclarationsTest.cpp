@@ -1,3 +1,4 @@
+#include "Platform/Base/Counting.h"
 #include "Prolog/PrologTesting.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "xquery/XQuery.h"
@@ -58,7 +59,7 @@ TEST(FunctionDecl, IsExternalWithoutExpression) {
 
 TEST(Declarations, DoNotOwnTheirProlog) {
   const auto prolog = prologOf({variable("x"), function("local:f")});
-  EXPECT_TRUE(prolog->hasOneReference());
+  EXPECT_TRUE(NSCounting::hasOneReference(*prolog));
 }
 
 TEST(Param, IsAnExpressionWithAName) {

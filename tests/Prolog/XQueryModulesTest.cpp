@@ -1,3 +1,4 @@
+#include "Platform/Base/Counting.h"
 #include "Prolog/PrologTesting.h"
 #include "Prolog/XQueryModules.h"
 
@@ -40,7 +41,7 @@ TEST(Modules, EveryBuiltinNamespaceHasItsID) {
 
 TEST(Modules, BuiltinNamespacesAreSharedObjects) {
   EXPECT_EQ(XQueryModules::builtinNamespaceForID(7), XQueryModules::builtinNamespaceForID(7));
-  EXPECT_TRUE(XQueryModules::builtinNamespaceForID(7)->isImmortal());
+  EXPECT_TRUE(NSCounting::isImmortal(*XQueryModules::builtinNamespaceForID(7)));
 }
 
 TEST(Modules, NoBuiltinNamespaceOutsideOneToEleven) {
@@ -138,7 +139,7 @@ TEST(Modules, APrologKeepsItsRegistry) {
     module = prologOf({moduleNamespace("m", "urn:m")}, modules);
     EXPECT_EQ(modules->prologForID(12), module.get());
   }
-  EXPECT_TRUE(module->hasOneReference());
+  EXPECT_TRUE(NSCounting::hasOneReference(*module));
   EXPECT_EQ(module->namespaceID(text("urn:m")), 12);
 }
 

@@ -1,3 +1,4 @@
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Dates/ZoneTestSupport.h"
 #include "Types/XQueryNumber.h"
@@ -35,7 +36,7 @@ TEST(XQueryNumber, SharedValuesAreDoublesMadeOnce) {
   for (XQueryNumber* shared : {XQueryNumber::posInf(), XQueryNumber::negInf(), XQueryNumber::nan(),
                                XQueryNumber::zero(), XQueryNumber::one()}) {
     EXPECT_EQ(shared->typeID(), XQueryTypeDouble);
-    EXPECT_TRUE(shared->isImmortal());
+    EXPECT_TRUE(NSCounting::isImmortal(*shared));
   }
   EXPECT_EQ(XQueryNumber::nan(), XQueryNumber::nan());
   EXPECT_EQ(XQueryNumber::posInf()->doubleValue(), infinity);

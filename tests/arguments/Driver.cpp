@@ -54,7 +54,7 @@ Ref<XQuery> compiledCall(const std::string& name, size_t count) {
 
 // What the call comes to, and what it shows to be wrong in the function's row of the registry.
 std::string outcomeOf(const XQuery& query, const Call& call, const std::string& function) {
-  XQueryConstants constants;
+  XQueryVariables constants;
   for (size_t i = 0; i < call.count(); ++i) {
     constants[std::string(1, variables[i])] = call.arguments[i]->value;
   }

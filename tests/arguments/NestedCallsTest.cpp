@@ -103,7 +103,7 @@ void evaluateOften(const std::string& body, Generator& generator, XQueryContext&
       body);
   ASSERT_FALSE(query->parseErrors()) << body;
   for (int round = 0; round < 5; ++round) {
-    XQueryConstants constants;
+    XQueryVariables constants;
     std::string chosen;
     for (const char name : std::string_view("abcde")) {
       const auto& [label, value] = values()[generator.below(values().size())];

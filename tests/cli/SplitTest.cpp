@@ -125,8 +125,16 @@ TEST(SplitCommand, WritesNoOtherThingsThanElementsOfTheDocument) {
     EXPECT_EQ(piecesIn(directory.path("parts")), Texts{});
   }
   const TemporaryDirectory directory;
-  const Outcome made = split("for $b in /a/b return <c/>", "1", "-", directory.path("made"), text);
-  EXPECT_EQ(made.err, "xquery: --split: the path gives an element that is not the document's\n");
+  const std::string loaded = "doc('" + directory.write("other.xml", "<a><b/></a>") + "')/a/b";
+  for (const std::string& made :
+       {std::string("<c/>"), std::string("document { <c/> }/c"), loaded}) {
+    const std::string folder = directory.path("made" + std::to_string(made.size()));
+    const Outcome outcome = split("for $b in /a/b return " + made, "1", "-", folder, text);
+    EXPECT_EQ(outcome.err,
+              "xquery: --split: the path gives an element that is not the document's\n")
+        << made;
+    EXPECT_EQ(piecesIn(folder), Texts{});
+  }
   const Outcome turned = split("for $b in /a/b return ($b/d, $b/c)", "1", "-",
                                directory.path("turned"), "<a><b><c/><d/></b></a>");
   EXPECT_EQ(turned.err,

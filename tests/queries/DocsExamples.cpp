@@ -123,11 +123,11 @@ std::string printed(const NSObject& item) {
   return XQueryItemStringValue(item);
 }
 
-XQueryConstants constantsOf(const Example& example) {
+XQueryVariables constantsOf(const Example& example) {
   const size_t equals = example.variable.find('=');
   if (equals == std::string::npos) return {};
   return {{example.variable.substr(0, equals),
-           XQueryUntypedAtomic(std::string_view(example.variable).substr(equals + 1))}};
+           NSString::stringWithUTF8(std::string_view(example.variable).substr(equals + 1))}};
 }
 
 }  // namespace

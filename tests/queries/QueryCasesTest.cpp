@@ -41,7 +41,7 @@ namespace {
 struct Case {
   std::string file;
   int line = 0;
-  XQueryConstants constants;
+  XQueryVariables constants;
   std::map<std::string, std::string> namespaces;
   std::string xml;
   std::map<std::string, std::string> files;
@@ -64,7 +64,7 @@ void readHeader(Case& c, std::string header, std::string& section, std::string& 
   name = header;
   if (section == "var") {
     const std::string variable = takeUpTo(header, '=');
-    c.constants[variable] = XQueryUntypedAtomic(header);
+    c.constants[variable] = NSString::stringWithUTF8(header);
   } else if (section == "namespace") {
     const std::string prefix = takeUpTo(header, '=');
     c.namespaces[prefix] = header;

@@ -78,7 +78,7 @@ class Prepared {
 };
 
 Result run(XQueryContext& context, const XQuery& query, const Settings& settings, bool isKept,
-           const XQueryConstants& constants, const Value& item) {
+           const XQueryVariables& constants, const Value& item) {
   const UnderWay underWay(settings.cancellation);
   const Prepared prepared(context, settings, underWay, isKept);
   Ref<XQueryError> error;
@@ -104,7 +104,7 @@ Value contextItemFrom(const py::object& item) {
 
 Result evaluate(const Compiled& compiled, const Settings& settings, const py::object& item,
                 const py::dict& variables) {
-  const XQueryConstants constants = constantsFrom(variables);
+  const XQueryVariables constants = constantsFrom(variables);
   const Ref<XQueryContext> context = newContext(settings);
   return run(*context, *compiled.query, settings, false, constants, contextItemFrom(item));
 }
@@ -131,7 +131,7 @@ Result evaluateIn(Session& session, const Compiled& compiled, const Settings& se
                   const py::object& item, const py::dict& variables) {
   const Taken taken(session);
   if (!session.context) throw py::value_error("the context is closed");
-  const XQueryConstants constants = constantsFrom(variables);
+  const XQueryVariables constants = constantsFrom(variables);
   return run(*session.context, *compiled.query, settings, true, constants, contextItemFrom(item));
 }
 
@@ -202,7 +202,7 @@ py::object describe(const Profile& self, const std::string& format) {
 
 Result evaluateProfiled(const Compiled& compiled, Profile& profile, const Settings& settings,
                         const py::object& item, const py::dict& variables) {
-  const XQueryConstants constants = constantsFrom(variables);
+  const XQueryVariables constants = constantsFrom(variables);
   const Ref<XQueryContext> context = newContext(settings);
   struct Adding {
     Profile& profile;

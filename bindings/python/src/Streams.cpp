@@ -226,7 +226,7 @@ class Stream {
   Ref<XQueryContext> _context;
   py::object _read;
   std::string _name;
-  XQueryConstants _constants;
+  XQueryVariables _constants;
   std::shared_ptr<Cancellation> _cancellation;
   Cancellation::Flag _flag = std::make_shared<std::atomic<bool>>(false);
   XQueryStreamInput _input;

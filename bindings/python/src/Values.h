@@ -14,7 +14,7 @@ py::object toPython(const NSObject& item);
 Value fromPython(py::handle object);
 
 // The names of a dictionary without the dollar sign, and the values for them.
-XQueryConstants constantsFrom(const py::dict& variables);
+XQueryVariables constantsFrom(const py::dict& variables);
 
 // Dates, times and durations, with the classes of their own where Python's cannot hold the value.
 py::object dateToPython(const Value& value, XQueryItemType type);

@@ -136,8 +136,8 @@ Value fromPython(py::handle object) {
   return otherFromPython(object);
 }
 
-XQueryConstants constantsFrom(const py::dict& variables) {
-  XQueryConstants constants;
+XQueryVariables constantsFrom(const py::dict& variables) {
+  XQueryVariables constants;
   for (const auto& [name, value] : variables) {
     if (!PyUnicode_Check(name.ptr())) throw py::type_error("the name of a variable is a str");
     constants.insert_or_assign(fromStr(name), fromPython(value));

@@ -18,7 +18,8 @@ typedef int xq_status;
 enum {
   XQ_OK = 0,
   XQ_END = 1,      /* there is none: no item, node, error or call there */
-  XQ_ERROR = 2,    /* the query does not compile or its evaluation failed; an xq_error says why */
+  XQ_ERROR = 2,    /* the query does not compile or its evaluation failed; an xq_error says why. In
+                      a callback also that a limit of what goes on around it was reached */
   XQ_INPUT = 3,    /* a document cannot be read or is malformed; text that is not UTF-8 */
   XQ_USAGE = 4,    /* a null handle, one of another kind or one in use, a senseless argument */
   XQ_MEMORY = 5,   /* there is no memory for it; what was there before is as it was */

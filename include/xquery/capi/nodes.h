@@ -29,7 +29,7 @@ enum {
  * bzip2. External entities are never read. What cannot be read or is not well formed is XQ_INPUT
  * with an error that has the place. The node is the document, and the caller's. */
 
-/* A path is bytes, without a zero among them; "-" is standard input. */
+/* A path is bytes, without a zero among them, and never a null pointer; "-" is standard input. */
 XQUERY_EXPORT xq_status xq_read_file(const char* path, size_t length, xq_reading flags,
                                      xq_node** document, xq_error** error);
 /* Not looked at after the call. XQ_NUL is no length here. */

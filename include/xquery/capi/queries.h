@@ -79,7 +79,8 @@ XQUERY_EXPORT xq_status xq_context_set_options(xq_context* context, const xq_opt
  * prefix:local, without the dollar sign. Names that a query does not know do not matter to it. */
 XQUERY_EXPORT xq_status xq_context_set_variable(xq_context* context, const char* name,
                                                 size_t length, const xq_value* value);
-/* Of an untyped text, as the command's --var; of a node. */
+/* Of an untyped text, as the command's --var, XQ_MISMATCH where it holds a character that XML does
+ * not have; of a node. */
 XQUERY_EXPORT xq_status xq_context_set_variable_text(xq_context* context, const char* name,
                                                      size_t length, const char* text,
                                                      size_t text_length);

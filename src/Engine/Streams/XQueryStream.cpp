@@ -137,8 +137,8 @@ class Stream {
     _internal._setInScopeVariables(nullptr);
     _internal.setContextItem(records.document(), 1);
     const uint32_t references = records.references();
-    const auto receive = [&](const NSXMLElement&) {
-      if (_input.beforeRecord) _input.beforeRecord(records.elementsKept());
+    const auto receive = [&](const NSXMLElement& record) {
+      if (_input.beforeRecord) _input.beforeRecord(record, records.elementsKept());
       if (!evaluateRecord(folding)) return false;
       _internal._setInScopeVariables(nullptr);
       _internal.clearKept();
@@ -186,7 +186,7 @@ class Stream {
 
 }  // namespace
 
-bool XQueryContext::evaluateStream(const XQuery& query, const XQueryConstants& constants,
+bool XQueryContext::evaluateStream(const XQuery& query, const XQueryVariables& constants,
                                    const XQueryStreamInput& input, const StreamReceiver& receive,
                                    XQueryStreamFailure& failure) {
   failure = {};

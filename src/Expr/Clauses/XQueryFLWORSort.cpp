@@ -24,8 +24,8 @@
 
 #include "Expr/Clauses/StableMergeSort.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Numbers/NSDecimal.h"
 #include "Types/XQueryTypeTable.h"
-#include "xquery/Number.h"
 #include "xquery/String.h"
 
 #include <algorithm>

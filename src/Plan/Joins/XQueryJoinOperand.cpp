@@ -1,8 +1,8 @@
 #include "Plan/Joins/XQueryJoinOperand.h"
 
+#include "Platform/Numbers/NSDecimal.h"
 #include "Platform/Numbers/NumberText.h"
 #include "Types/XQueryTypeTable.h"
-#include "xquery/Number.h"
 #include "xquery/String.h"
 
 #include <cmath>

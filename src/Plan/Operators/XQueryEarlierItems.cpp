@@ -7,8 +7,8 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Joins/XQueryJoinTable.h"
+#include "Platform/Numbers/NSDecimal.h"
 #include "Types/XQueryItemKinds.h"
-#include "xquery/Number.h"
 
 #include <algorithm>
 #include <cmath>

@@ -16,6 +16,7 @@
 
 #include "Expr/Operators/XQueryArithmetic.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryNumericOperand.h"
@@ -139,7 +140,7 @@ Value XQueryQuickSign(int type, const Value&, const Value& operand, XQueryContex
   static const Ref<XQueryNumber> zero = [] {
     const LastingObjects lasting;
     Ref<XQueryNumber> integer = XQueryNumber::integerWithInt64(0);
-    integer->makeImmortal();
+    NSCounting::makeImmortal(*integer);
     return integer;
   }();
   return answerFor(type, zero.get(), operand.get());

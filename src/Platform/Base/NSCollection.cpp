@@ -1,3 +1,4 @@
+#include "Platform/Base/Counting.h"
 #include "xquery/Collection.h"
 
 #include <array>
@@ -12,7 +13,7 @@ NSNull* NSNull::null() {
   alignas(64) static unsigned char storage[64];
   static NSNull* const shared = [] {
     auto* object = ::new (storage) NSNull();
-    object->makeImmortal();
+    NSCounting::makeImmortal(*object);
     return object;
   }();
   return shared;

@@ -1,3 +1,4 @@
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/NSLog.h"
 #include "Platform/Base/XQueryErrorTrace.h"
 #include "xquery/Error.h"
@@ -11,7 +12,7 @@ namespace {
 const Ref<NSString>& errorDomain() {
   static const Ref<NSString> domain = [] {
     Ref<NSString> text = NSString::stringWithASCII("XQueryErrorDomain");
-    text->makeImmortal();
+    NSCounting::makeImmortal(*text);
     return text;
   }();
   return domain;

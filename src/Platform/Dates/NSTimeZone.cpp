@@ -1,3 +1,4 @@
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Dates/ICUTimeZone.h"
 #include "xquery/Date.h"
@@ -19,7 +20,7 @@ struct OffsetOrRules {
 };
 
 NSTimeZone* shared(Ref<NSTimeZone> zone) {
-  zone->makeImmortal();
+  NSCounting::makeImmortal(*zone);
   return zone.detach();
 }
 

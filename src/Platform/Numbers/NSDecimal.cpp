@@ -4,10 +4,11 @@
 // built-ins report none, and a general path on big integers. Both end in the same canonical form:
 // no trailing zeros after the point, a scale of at least 0, and a big coefficient only for what
 // 64 bits do not hold. So equality of values is equality of representations.
+#include "Platform/Numbers/NSDecimal.h"
+
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Numbers/BigInteger.h"
 #include "Platform/Numbers/NumberText.h"
-#include "xquery/Number.h"
 
 #include <algorithm>
 #include <charconv>

@@ -1,6 +1,7 @@
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
+#include "Platform/Numbers/NSDecimal.h"
 #include "Platform/Numbers/NumberText.h"
-#include "xquery/Number.h"
 
 #include <charconv>
 #include <cmath>
@@ -47,7 +48,7 @@ std::string formatFloating(double value, bool single) {
 NSNumber* sharedBoolean(bool value) {
   const LastingObjects lasting;
   auto number = make<NSNumber>(Kind::Number, uint16_t{0}, value);
-  number->makeImmortal();
+  NSCounting::makeImmortal(*number);
   return number.detach();
 }
 
@@ -78,8 +79,9 @@ NSNumber::NSNumber(Kind kind, uint16_t aux, float value) : NSCounted(kind), _flo
   _flags = static_cast<uint8_t>(Storage::Float);
 }
 
-NSNumber::NSNumber(Kind kind, uint16_t aux, NSDecimal value)
-    : NSCounted(kind), _decimal(std::move(value)) {
+NSNumber::NSNumber(Kind kind, uint16_t aux, NSDecimal value) : NSCounted(kind) {
+  static_assert(sizeof(NSDecimal) == sizeof(_decimal) && alignof(NSDecimal) == 8);
+  ::new (_decimal) NSDecimal(std::move(value));
   _aux = aux;
   _flags = static_cast<uint8_t>(Storage::Decimal);
 }
@@ -103,14 +105,14 @@ NSNumber::NSNumber(Kind kind, uint16_t aux, const NSNumber& value) : NSCounted(k
       _float = value._float;
       break;
     case Storage::Decimal:
-      ::new (&_decimal) NSDecimal(value._decimal);
+      ::new (_decimal) NSDecimal(*value.storedDecimal());
       break;
   }
   _flags = value._flags;
 }
 
 NSNumber::~NSNumber() {
-  if (storage() == Storage::Decimal) _decimal.~NSDecimal();
+  if (const NSDecimal* decimal = storedDecimal()) decimal->~NSDecimal();
 }
 
 NSNumber* NSNumber::trueValue() {
@@ -141,7 +143,7 @@ Ref<NSNumber> NSNumber::numberWithFloat(float value) {
 
 bool NSNumber::boolValue() const {
   // A decimal may be too small for a double and still not be zero.
-  if (storage() == Storage::Decimal) return !_decimal.isZero() && !_decimal.isNaN();
+  if (const NSDecimal* decimal = storedDecimal()) return !decimal->isZero() && !decimal->isNaN();
   const double value = doubleValue();
   return value != 0 && !std::isnan(value);
 }
@@ -159,7 +161,7 @@ double NSNumber::doubleValue() const {
     case Storage::Float:
       return static_cast<double>(_float);
     case Storage::Decimal:
-      return _decimal.doubleValue();
+      return storedDecimal()->doubleValue();
   }
   return 0;
 }
@@ -181,7 +183,7 @@ int64_t NSNumber::longLongValue() const {
     case Storage::Float:
       return saturatedInt64(static_cast<double>(_float));
     case Storage::Decimal:
-      return _decimal.int64Value();
+      return storedDecimal()->int64Value();
   }
   return 0;
 }
@@ -199,7 +201,7 @@ uint64_t NSNumber::unsignedLongLongValue() const {
     case Storage::Float:
       return saturatedUInt64(static_cast<double>(_float));
     case Storage::Decimal:
-      return _decimal.uint64Value();
+      return storedDecimal()->uint64Value();
   }
   return 0;
 }
@@ -218,7 +220,7 @@ NSDecimal NSNumber::decimalValue() const {
     case Storage::UInt64:
       return NSDecimal::fromUnsigned(_uint64);
     case Storage::Decimal:
-      return _decimal;
+      return *storedDecimal();
     case Storage::Float: {
       // The digits that the number prints, not those of the double beside it.
       NSDecimal value;
@@ -239,7 +241,9 @@ int NSNumber::compare(const NSNumber& other) const {
   if (a == Storage::Int64 && b == Storage::Int64) {
     return _int64 < other._int64 ? -1 : _int64 > other._int64 ? 1 : 0;
   }
-  if (a == Storage::Decimal && b == Storage::Decimal) return _decimal.compare(other._decimal);
+  if (a == Storage::Decimal && b == Storage::Decimal) {
+    return storedDecimal()->compare(*other.storedDecimal());
+  }
   const bool floating =
       a == Storage::Double || a == Storage::Float || b == Storage::Double || b == Storage::Float;
   if (floating) return compareDoubles(doubleValue(), other.doubleValue());
@@ -263,7 +267,7 @@ std::string NSNumber::stringValue() const {
     case Storage::Float:
       return formatFloating(static_cast<double>(_float), true);
     case Storage::Decimal:
-      return _decimal.toString();
+      return storedDecimal()->toString();
   }
   return {};
 }

@@ -1,7 +1,7 @@
 // What decimals and platform numbers share: reading digits and the hash of a numeric value.
 #pragma once
 
-#include "xquery/Number.h"
+#include "Platform/Numbers/NSDecimal.h"
 
 #include <cstdint>
 #include <string>

@@ -5,6 +5,7 @@
 //   InTree   in the arena of a tree, which `owner` keeps alive
 //   Shared   in the buffer of another string, which `owner` keeps alive
 //   none     in a buffer of its own
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Text/Blocks.h"
 #include "Platform/Text/UTF16.h"
@@ -144,7 +145,7 @@ NSString::NSString(Kind kind, uint16_t aux, const NSString& text) : NSCounted(ki
   }
   if (!(_flags & Shared)) _external.owner = &text;
   _flags |= Shared;
-  static_cast<const NSString*>(_external.owner)->retain();
+  NSCounting::retain(*static_cast<const NSString*>(_external.owner));
 }
 
 NSString::~NSString() {
@@ -152,7 +153,7 @@ NSString::~NSString() {
   if (_flags & InTree) {
     releaseTreeOf(static_cast<const NSXMLNode*>(_external.owner));
   } else if (_flags & Shared) {
-    static_cast<const NSString*>(_external.owner)->release();
+    NSCounting::release(*static_cast<const NSString*>(_external.owner));
   } else {
     freeValueMemory(const_cast<void*>(_external.units), byteCount(view()));
   }
@@ -202,7 +203,7 @@ const Ref<NSString>& NSString::empty() {
   static const Ref<NSString>* const shared = [] {
     const LastingObjects lasting;
     auto* reference = ::new (storage) Ref<NSString>(stringWithView({}));
-    (*reference)->makeImmortal();
+    NSCounting::makeImmortal(**reference);
     return reference;
   }();
   return *shared;

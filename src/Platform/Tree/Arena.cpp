@@ -1,6 +1,7 @@
 #include "Platform/Tree/Arena.h"
 
 #include "Platform/Base/Abandoned.h"
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/RangeMemory.h"
 #include "Platform/Base/WorkMeter.h"
@@ -23,7 +24,7 @@ namespace xquery {
 namespace {
 
 static_assert(sizeof(NSXMLProcessingInstruction) == 32);
-static_assert(NSXMLRange == RangeRuns::windowBytes);
+static_assert(NSXMLRangeBytes == RangeRuns::windowBytes);
 
 size_t bytesOf(NSStringView text) {
   return size_t{text.length()} * (text.isWide() ? sizeof(char16_t) : 1);
@@ -125,7 +126,7 @@ void NSXMLTree::destroy() {
   }
   dropIndexes();
   if (NSXMLTreeExtra* present = extra()) {
-    for (NSXMLDocument* document : present->documents) document->_URI->release();
+    for (NSXMLDocument* document : present->documents) NSCounting::release(*document->_URI);
   }
   forEachName([](const NSXMLName* name) { NSXMLReleaseName(name); });
   freeBaseURIs();
@@ -288,7 +289,7 @@ void NSXMLTree::setURI(NSXMLDocument* document, const NSString* URI) {
   NSString* text = URI ? NSString::stringWithView(URI->view()).detach() : nullptr;
   auto& documents = makeExtra().documents;
   if (document->_URI) {
-    document->_URI->release();
+    NSCounting::release(*document->_URI);
     std::erase(documents, document);
   }
   document->_URI = text;

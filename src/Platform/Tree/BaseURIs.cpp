@@ -7,6 +7,7 @@
 //
 // Reading does not change the ring, only the place where the next search starts, so that several
 // threads may ask.
+#include "Platform/Base/Counting.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 
@@ -43,7 +44,7 @@ bool NSXMLTree::recordBaseURI(const NSXMLNode* node, uint64_t owner, const Ref<N
   if (isKnown && isAlike) return false;
   tree._baseURIsAreAlike = isAlike;
   if (NSXMLBaseURI* entry = isKnown ? findEntry(last, node, owner) : nullptr) {
-    entry->URI->release();
+    NSCounting::release(*entry->URI);
     entry->URI = Ref<NSString>(URI).detach();
     return false;
   }
@@ -86,7 +87,7 @@ void NSXMLTree::freeBaseURIs() {
   _baseURIs->next = nullptr;
   while (entry) {
     NSXMLBaseURI* next = entry->next;
-    entry->URI->release();
+    NSCounting::release(*entry->URI);
     NSCounted::operator delete(entry, sizeof(NSXMLBaseURI));
     entry = next;
   }

@@ -47,10 +47,6 @@ void chargeWay(int64_t count) {
 
 // --- navigation ------------------------------------------------------------------------------
 
-NSXMLTree* NSXMLNode::tree() const {
-  return NSXMLTree::of(this);
-}
-
 uint32_t NSXMLNode::childCount() const {
   uint32_t count = 0;
   for (const NSXMLNode* child = firstChild(); child; child = child->_next) ++count;
@@ -184,7 +180,7 @@ void NSXMLNode::setStringValue(NSStringView text) {
   if (NSXMLTree::isFixed(this) || NSXMLTree::isFrozen(this)) return;
   if (!isBranch()) {
     NSXMLTree::noteTextChange(this);
-    tree()->setText(this, text);
+    NSXMLTree::of(this)->setText(this, text);
     return;
   }
   while (_firstChild) _firstChild->detach();

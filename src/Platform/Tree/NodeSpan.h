@@ -23,7 +23,7 @@ class NSXMLNodePlace {
  public:
   NSXMLNodePlace() = default;
   explicit NSXMLNodePlace(const NSXMLNode* node)
-      : _place(static_cast<uint32_t>(reinterpret_cast<uintptr_t>(node) % NSXMLRange / unit)) {}
+      : _place(static_cast<uint32_t>(reinterpret_cast<uintptr_t>(node) % NSXMLRangeBytes / unit)) {}
 
   // The node, given the start of the range.
   NSXMLNode* node(uintptr_t start) const {
@@ -31,7 +31,7 @@ class NSXMLNodePlace {
   }
   // The process has one range, so that any of its nodes tells where it starts.
   static uintptr_t start(const NSXMLNode* node) {
-    return reinterpret_cast<uintptr_t>(node) & ~(NSXMLRange - 1);
+    return reinterpret_cast<uintptr_t>(node) & ~(NSXMLRangeBytes - 1);
   }
 
   friend bool operator==(NSXMLNodePlace, NSXMLNodePlace) = default;

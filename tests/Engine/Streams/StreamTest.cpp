@@ -45,7 +45,7 @@ struct Answer {
 };
 
 Answer streamed(XQueryContext& context, std::string_view query, const XQueryStreamInput& input,
-                const XQueryConstants& constants = {}) {
+                const XQueryVariables& constants = {}) {
   Answer answer;
   XQueryStreamFailure failure;
   const bool isComplete = context.evaluateStream(
@@ -174,7 +174,7 @@ TEST(Stream, ResolvesNamesInItsContext) {
 TEST(Stream, IsGivenConstants) {
   const Answer answer =
       streamed(*XQueryContext::xqueryContext(), "declare variable $n external; /a/b[c = $n]/@i",
-               inputOf(documents[2]), {{"n", XQueryUntypedAtomic("2")}});
+               inputOf(documents[2]), {{"n", NSString::stringWithUTF8("2")}});
   EXPECT_EQ(answer.items, std::vector<std::string>{"attribute():i=\"3\""});
 }
 
@@ -393,7 +393,10 @@ TEST(Stream, TellsWhichElementsAboveARecordAreTheSame) {
   std::vector<std::string> heard;
   XQueryStreamInput input =
       inputOf("<a><b><c/><c/></b><b><x/><c><c/></c></b><b/><d><c/></d><c/></a>");
-  input.beforeRecord = [&](size_t kept) { heard.push_back(std::to_string(kept)); };
+  input.beforeRecord = [&](const NSXMLElement& record, size_t kept) {
+    heard.push_back(record.nameView().utf8() + std::to_string(kept));
+    EXPECT_TRUE(record.rootDocument());
+  };
   XQueryStreamFailure failure;
   const auto context = XQueryContext::xqueryContext();
   EXPECT_TRUE(context->evaluateStream(
@@ -403,8 +406,8 @@ TEST(Stream, TellsWhichElementsAboveARecordAreTheSame) {
         return true;
       },
       failure));
-  EXPECT_EQ(heard, (std::vector<std::string>{"0", "item", "2", "item", "1", "item", "item", "1",
-                                             "item", "1", "item"}));
+  EXPECT_EQ(heard, (std::vector<std::string>{"c0", "item", "c2", "item", "c1", "item", "item", "c1",
+                                             "item", "c1", "item"}));
 }
 
 }  // namespace

@@ -1,3 +1,4 @@
+#include "Platform/Base/Counting.h"
 #include "xquery/Collection.h"
 #include "xquery/Number.h"
 
@@ -23,9 +24,9 @@ TEST(Collection, NewArrayIsEmpty) {
 TEST(Collection, ArrayKeepsItsElementsAlive) {
   Ref<NSNumber> number = NSNumber::numberWithLongLong(5);
   Ref<NSArray> array = NSArray::arrayWithObjects({number});
-  EXPECT_FALSE(number->hasOneReference());
+  EXPECT_FALSE(NSCounting::hasOneReference(*number));
   array = nullptr;
-  EXPECT_TRUE(number->hasOneReference());
+  EXPECT_TRUE(NSCounting::hasOneReference(*number));
 }
 
 TEST(Collection, NullIsOneObject) {

@@ -1,7 +1,7 @@
 #include "Platform/Base/ProcessorTime.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Numbers/NSDecimal.h"
 #include "Platform/Numbers/NumberText.h"
-#include "xquery/Number.h"
 
 #include <gtest/gtest.h>
 

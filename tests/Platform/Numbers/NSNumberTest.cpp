@@ -1,3 +1,5 @@
+#include "Platform/Base/Counting.h"
+#include "Platform/Numbers/NSDecimal.h"
 #include "xquery/Number.h"
 
 #include <gtest/gtest.h>
@@ -90,7 +92,7 @@ TEST(Number, BooleansAreTwoSharedObjects) {
   EXPECT_EQ(NSNumber::numberWithBool(true).get(), NSNumber::trueValue());
   EXPECT_EQ(NSNumber::numberWithBool(false).get(), NSNumber::falseValue());
   EXPECT_NE(NSNumber::trueValue(), NSNumber::falseValue());
-  EXPECT_TRUE(NSNumber::trueValue()->isImmortal());
+  EXPECT_TRUE(NSCounting::isImmortal(*NSNumber::trueValue()));
   EXPECT_TRUE(NSNumber::trueValue()->isBoolean());
   EXPECT_FALSE(NSNumber::numberWithLongLong(1)->isBoolean());
   EXPECT_EQ(NSNumber::trueValue()->stringValue(), "true");

@@ -1,3 +1,4 @@
+#include "Platform/Base/Counting.h"
 #include "xquery/String.h"
 #include "xquery/XMLNode.h"
 
@@ -110,7 +111,7 @@ TEST(String, LoneSurrogatesAreKeptAndWrittenAsReplacementCharacters) {
 
 TEST(String, EmptyStringIsSharedAndNeverFreed) {
   EXPECT_EQ(NSString::empty().get(), NSString::empty().get());
-  EXPECT_TRUE(NSString::empty()->isImmortal());
+  EXPECT_TRUE(NSCounting::isImmortal(*NSString::empty()));
   EXPECT_EQ(NSString::empty()->length(), 0U);
   EXPECT_EQ(NSString::stringWithUTF8("")->length(), 0U);
 }

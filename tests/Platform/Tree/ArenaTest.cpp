@@ -165,7 +165,7 @@ TEST(XMLTree, AddingANodeMovesItAndKeepsItsIdentity) {
   EXPECT_TRUE(parent->addChild(child));
   EXPECT_EQ(parent->firstChild(), identity);
   EXPECT_EQ(child->parent(), parent.get());
-  EXPECT_EQ(child->tree(), parent->tree());
+  EXPECT_EQ(NSXMLTree::of(child.get()), NSXMLTree::of(parent.get()));
   EXPECT_EQ(parent->stringValue()->utf8(), "t");
 }
 
@@ -435,7 +435,7 @@ TEST(XMLTree, ManyTreesMergeIntoOne) {
   NSXMLNode* child = parent->firstChild();
   for (NSXMLNode* expected : children) {
     ASSERT_EQ(child, expected);
-    ASSERT_EQ(child->tree(), parent->tree());
+    ASSERT_EQ(NSXMLTree::of(child), NSXMLTree::of(parent.get()));
     child = child->nextSibling();
   }
   EXPECT_EQ(parent->stringValue()->length(), 20000u);

@@ -1,3 +1,4 @@
+#include "Platform/Base/Counting.h"
 #include "Platform/Tree/Arena.h"
 
 #include <gtest/gtest.h>
@@ -48,15 +49,15 @@ TEST(XMLBaseURIs, OtherNodesOfTheTreeHaveNone) {
 
 TEST(XMLBaseURIs, TheyGoWithTheTree) {
   const auto one = URI("a base URI that is too long to be kept within the string itself");
-  EXPECT_TRUE(one->hasOneReference());
+  EXPECT_TRUE(NSCounting::hasOneReference(*one));
   {
     const auto a = element("a");
     NSXMLTree::recordBaseURI(a.get(), 1, one);
     NSXMLTree::recordBaseURI(a.get(), 2, one);
-    EXPECT_FALSE(one->hasOneReference());
+    EXPECT_FALSE(NSCounting::hasOneReference(*one));
     NSXMLTree::recordBaseURI(a.get(), 2, URI("two"));
   }
-  EXPECT_TRUE(one->hasOneReference());
+  EXPECT_TRUE(NSCounting::hasOneReference(*one));
 }
 
 TEST(XMLBaseURIs, ANewNodeInThePlaceOfAnOldOneHasNone) {
@@ -89,7 +90,7 @@ TEST(XMLBaseURIs, TheyStayWithTheirNodesWhenTreesAreJoined) {
       EXPECT_EQ(recorded(holder, 2), index % 3 > 1 ? "one" : "(none)");
     }
   }
-  EXPECT_TRUE(one->hasOneReference());
+  EXPECT_TRUE(NSCounting::hasOneReference(*one));
 }
 
 TEST(XMLBaseURIs, ADetachedNodeKeepsItsOwn) {

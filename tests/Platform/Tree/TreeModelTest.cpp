@@ -277,7 +277,7 @@ class Forest {
       }
       ASSERT_EQ(child->parent(), node);
       ASSERT_EQ(child->previousSibling(), previous);
-      ASSERT_EQ(child->tree(), node->tree());
+      ASSERT_EQ(NSXMLTree::of(child), NSXMLTree::of(node));
       ASSERT_NO_FATAL_FAILURE(expectSame(*each, child));
       previous = child;
       child = child->nextSibling();
