@@ -16,11 +16,15 @@ std::string withoutPrologLines(const std::string& plan, size_t prologLines) {
     uint64_t line = 0;
     const auto read = std::from_chars(rest.data() + number, rest.data() + rest.size(), line);
     result += rest.substr(0, number);
-    if (read.ec == std::errc()) {
-      result += std::to_string(line > prologLines ? line - prologLines : line);
+    const size_t end =
+        read.ec == std::errc() ? static_cast<size_t>(read.ptr - rest.data()) : number;
+    const bool isOfEntry = end > number && !rest.substr(end).starts_with(" of ");
+    if (isOfEntry && line > prologLines) {
+      result += std::to_string(line - prologLines);
+    } else {
+      result += rest.substr(number, end - number);
     }
-    rest.remove_prefix(read.ec == std::errc() ? static_cast<size_t>(read.ptr - rest.data())
-                                              : number);
+    rest.remove_prefix(end);
   }
   return result += rest;
 }

@@ -5,7 +5,7 @@
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Labels.h"
 #include "Platform/Base/WorkMeter.h"
-#include "Platform/Base/XQueryPlaces.h"
+#include "Platform/Base/XQueryPlaceColumns.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
@@ -105,25 +105,13 @@ void XQueryChecking::warnAt(const XQueryProlog& module, Spot spot, ID id, Parts 
   add(module, XQueryNoPlace, spot, warningOf(id, parts, name));
 }
 
-// In the order of the text, which is then read but once.
-void XQueryChecking::findColumns() {
-  const XQueryPlaces& places = *main.modules().places();
-  std::stable_sort(_found.begin(), _found.end(), [&](const Found& a, const Found& b) {
-    return std::tuple(a.module, places.span(a.number).start) <
-           std::tuple(b.module, places.span(b.number).start);
-  });
-  XQueryPlaceCursor cursor(places);
-  for (Found& each : _found) {
-    if (!cursor.goTo(each.number)) continue;
-    each.warning.line = cursor.line();
-    each.warning.column = cursor.column();
-    const XQuerySpan span = places.span(each.number);
-    each.warning.length = span.end - span.start;
-  }
-}
-
 std::vector<XQueryWarning> XQueryChecking::takeWarnings() {
-  findColumns();
+  XQueryFindColumns(*main.modules().places(), _found,
+                    [](Found& found, const XQueryPlaceColumn& at) {
+                      found.warning.line = at.line;
+                      found.warning.column = at.column;
+                      found.warning.length = at.length;
+                    });
   const auto keyOf = [](const Found& found) {
     const XQueryWarning& warning = found.warning;
     return std::tuple(found.module, warning.line, warning.column == 0, warning.column, found.place);

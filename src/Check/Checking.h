@@ -103,7 +103,6 @@ class XQueryChecking {
   };
   static Spot spotOf(const XQueryProgram& program, XQueryPlaceID place);
   void add(const XQueryProlog& module, XQueryPlaceID place, Spot spot, XQueryWarning warning);
-  void findColumns();
   size_t numberOf(const XQueryProlog& module);
   static XQueryWarning warningOf(ID id, Parts parts, const Ref<NSString>& name);
 

@@ -55,8 +55,8 @@ Ref<XQueryExpr> XQueryPlanned(const XQueryProlog& prolog, const Ref<XQueryExpr>&
   projection = XQueryPlanProjection(program, planning.facts);
   std::vector<XQueryPlanNote> notes;
   applyRules(planning, XQueryRules(), &notes);
-  report = XQueryPlanReport(planning, std::move(notes));
-  report.addInput(planning, projection);
+  report = XQueryPlanReport(planning, prolog, std::move(notes));
+  report.addInput(planning, prolog, projection);
   return program.install();
 }
 
@@ -70,7 +70,7 @@ Ref<XQueryExpr> XQueryProfiled(const XQueryProlog& prolog, const Ref<XQueryExpr>
     projection = XQueryPlanProjection(program, planning.facts);
     applyRules(planning, XQueryRules(), &notes);
   }
-  const XQueryPlanReport report(planning, std::move(notes));
+  const XQueryPlanReport report(planning, prolog, std::move(notes));
   XQueryProfileProgram(planning, report, prolog, profiled);
   return program.install();
 }

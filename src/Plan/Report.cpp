@@ -9,6 +9,7 @@
 #include "Prolog/XQueryDeclarations.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryQName.h"
+#include "xquery/URL.h"
 
 #include <algorithm>
 #include <utility>
@@ -16,13 +17,22 @@
 namespace xquery {
 namespace {
 
+// The URL of an imported module that the place lies in; empty for the main one.
+std::string moduleOf(const XQueryProgram& program, XQueryPlaceID place, const XQueryProlog& main) {
+  const XQueryProlog* prolog = program.bodyOf(place).prolog;
+  const bool isImported = prolog && prolog != &main && prolog->moduleURL();
+  return isImported ? prolog->moduleURL()->absoluteString()->utf8() : std::string();
+}
+
 // Lists what is worth a line of its own: not the tests and types, which the labels tell, nor the
 // lists of arguments and the parentheses around one expression, unless there is a note on them.
 class Listing {
  public:
-  Listing(const XQueryPlanning& planning, std::vector<XQueryPlanNote> notes)
+  Listing(const XQueryPlanning& planning, const XQueryProlog& main,
+          std::vector<XQueryPlanNote> notes)
       : _planning(planning),
         _program(planning.program),
+        _main(main),
         _notes(std::move(notes)),
         _depths(_program.placeCount()),
         _lines(_program.placeCount()),
@@ -45,6 +55,7 @@ class Listing {
  private:
   void addBody(const XQueryProgramBody& body) {
     if (!body.expr) return;
+    _module = moduleOf(_program, body.place, _main);
     std::string label = "query";
     if (body.function) {
       label = "function " + nameOf(*body.function->name(), *body.prolog) + "#" +
@@ -54,7 +65,7 @@ class Listing {
     }
     const XQueryFacts& facts = _planning.facts[body.place];
     _entries.push_back(
-        {0, {}, std::move(label), 0, XQueryLabelOfItems(facts), {}, {}, body.place, true});
+        {0, {}, std::move(label), 0, _module, XQueryLabelOfItems(facts), {}, {}, body.place, true});
   }
 
   // With a prefix that the module has for the namespace; the one that was written is not known any
@@ -85,8 +96,8 @@ class Listing {
     ++_depths[place];
     const XQueryFacts& facts = _planning.facts[place];
     _entries.push_back({_depths[place], std::exchange(_roles[place], {}), XQueryLabelOf(*at.expr),
-                        _lines[place], XQueryLabelOfItems(facts), XQueryLabelsOfDeeds(facts.deeds),
-                        std::move(notes), place, false});
+                        _lines[place], _module, XQueryLabelOfItems(facts),
+                        XQueryLabelsOfDeeds(facts.deeds), std::move(notes), place, false});
   }
 
   bool isPassedOver(XQueryPlaceID place) const {
@@ -114,6 +125,8 @@ class Listing {
 
   const XQueryPlanning& _planning;
   const XQueryProgram& _program;
+  const XQueryProlog& _main;
+  std::string _module;                 // of the body at hand
   std::vector<XQueryPlanNote> _notes;  // by place, those of one place in the order of the rules
   size_t _next = 0;
   std::vector<size_t> _depths;  // of places; of what is passed over that of its whole
@@ -161,6 +174,7 @@ std::string JSONOf(const XQueryPlanReport::Note& note) {
 std::string JSONOf(const XQueryPlanReport::Entry& entry) {
   std::string text = "{\"label\":" + quoted(entry.label);
   if (entry.line) text += ",\"line\":" + std::to_string(entry.line);
+  if (!entry.module.empty()) text += ",\"module\":" + quoted(entry.module);
   if (!entry.role.empty()) text += ",\"role\":" + quoted(entry.role);
   text += ",\"items\":" + quoted(entry.items) + ",\"deeds\":[";
   for (size_t i = 0; i < entry.deeds.size(); ++i) text += (i ? "," : "") + quoted(entry.deeds[i]);
@@ -181,11 +195,11 @@ std::string labelLine(std::string_view text) {
 
 }  // namespace
 
-XQueryPlanReport::XQueryPlanReport(const XQueryPlanning& planning,
+XQueryPlanReport::XQueryPlanReport(const XQueryPlanning& planning, const XQueryProlog& main,
                                    std::vector<XQueryPlanNote> notes)
-    : _entries(Listing(planning, std::move(notes)).entries()) {}
+    : _entries(Listing(planning, main, std::move(notes)).entries()) {}
 
-void XQueryPlanReport::addInput(const XQueryPlanning& planning,
+void XQueryPlanReport::addInput(const XQueryPlanning& planning, const XQueryProlog& main,
                                 const XQueryProjectionPlan& projection) {
   constexpr std::string_view rule = "projection";
   if (!projection.isPossible()) {
@@ -194,13 +208,14 @@ void XQueryPlanReport::addInput(const XQueryPlanning& planning,
                         {},
                         "input",
                         expr.exprLine() + 1,
+                        moduleOf(planning.program, projection.refusedAt, main),
                         "all of it, for " + XQueryLabelOf(expr),
                         {},
                         {{rule, projection.reason, true}}});
   } else if (projection.isUsed) {
     std::string paths = projection.projection.description();
     if (paths.empty()) paths = "the document element";
-    _entries.push_back({0, {}, "input", 0, std::move(paths), {}, {}});
+    _entries.push_back({0, {}, "input", 0, {}, std::move(paths), {}, {}});
   }
 }
 
@@ -215,7 +230,10 @@ std::string XQueryPlanReport::text() const {
     text += indent;
     if (!entry.role.empty()) text += std::string(entry.role) + ": ";
     text += entry.label;
-    if (entry.line) text += "  (line " + std::to_string(entry.line) + ")";
+    if (entry.line) {
+      text += "  (line " + std::to_string(entry.line);
+      text += (entry.module.empty() ? "" : " of " + entry.module) + ")";
+    }
     text += "  " + entry.items;
     if (!entry.deeds.empty()) text += "; " + joined(entry.deeds);
     text += "\n";

@@ -11,6 +11,7 @@
 namespace xquery {
 
 class XQueryPlanning;
+class XQueryProlog;
 struct XQueryPlanNote;
 struct XQueryProjectionPlan;
 
@@ -25,7 +26,8 @@ class XQueryPlanReport {
     size_t depth;           // 0 for the body of a query or a function, or the value of a variable
     std::string_view role;  // in its whole, where the label of that does not tell; or empty
     std::string label;
-    int64_t line;  // from 1; 0 where it is not known
+    int64_t line;        // from 1; 0 where it is not known
+    std::string module;  // the URL of the imported one that it is in; empty for the main one
     std::string items;
     std::vector<std::string_view> deeds;
     std::vector<Note> notes;  // in the order of the rules
@@ -35,9 +37,11 @@ class XQueryPlanReport {
 
   XQueryPlanReport() = default;
   // The rules have been applied.
-  XQueryPlanReport(const XQueryPlanning& planning, std::vector<XQueryPlanNote> notes);
+  XQueryPlanReport(const XQueryPlanning& planning, const XQueryProlog& main,
+                   std::vector<XQueryPlanNote> notes);
   // The last entry: what is read of the document, if anything looks at it.
-  void addInput(const XQueryPlanning& planning, const XQueryProjectionPlan& projection);
+  void addInput(const XQueryPlanning& planning, const XQueryProlog& main,
+                const XQueryProjectionPlan& projection);
 
   // Wholes before their parts; last, what is read of the document, if anything looks at it.
   const std::vector<Entry>& entries() const { return _entries; }
@@ -45,8 +49,8 @@ class XQueryPlanReport {
   // UTF-8. One line for each entry, indented by its depth, and below it "+" with what was done and
   // "-" with what was refused.
   std::string text() const;
-  // An array of objects with label, line, role, items, deeds, notes and parts, which are objects of
-  // the same shape.
+  // An array of objects with label, line, module, role, items, deeds, notes and parts, which are
+  // objects of the same shape.
   std::string JSON() const;
   // A graph for the tools that draw DOT: boxes, filled where a rule has done something.
   std::string DOT() const;

@@ -125,6 +125,38 @@ TEST(PlanReport, CountsLinesFromOne) {
   EXPECT_EQ(item->line, 4);
 }
 
+// Loads one module, whatever is asked for.
+class OneModule : public XQueryLoader {
+ public:
+  explicit OneModule(std::string text) : _text(std::move(text)) {}
+  std::optional<XQueryResource> load(const NSURL&, XQueryLoadPurpose) override {
+    return XQueryResource{_text, {}, {}, {}};
+  }
+
+ private:
+  const std::string _text;
+};
+
+TEST(PlanReport, NamesTheModuleOfALineThatIsImported) {
+  XQueryLoading loading;
+  loading.moduleURL = "http://h/query.xq";
+  loading.loader = std::make_shared<OneModule>(
+      "module namespace m = 'urn:m';\n\ndeclare function m:f($d) {\n  $d/a/.. };\n"
+      "declare variable $m:x := b/..;");
+  const auto query =
+      XQuery::xqueryWithSource("import module namespace m = 'urn:m' at 'm.xq';\nm:f(()), $m:x",
+                               loading, XQueryLimits(), XQueryWay::Explained);
+  ASSERT_FALSE(query->parseErrors());
+  const auto text = query->planDescription(XQueryPlanFormat::Text)->utf8();
+  EXPECT_THAT(text, HasSubstr("  $d/a/..  (line 4 of http://h/m.xq)  "));
+  EXPECT_THAT(text, HasSubstr("  b/..  (line 5 of http://h/m.xq)  "));
+  EXPECT_THAT(text, HasSubstr("  m:f(...)  (line 2)  "));
+  EXPECT_THAT(text, HasSubstr("\ninput  (line 5 of http://h/m.xq)  "));
+  const auto json = query->planDescription(XQueryPlanFormat::JSON)->utf8();
+  EXPECT_THAT(json, HasSubstr("{\"label\":\"$d/a/..\",\"line\":4,\"module\":\"http://h/m.xq\","));
+  EXPECT_THAT(json, HasSubstr("{\"label\":\"m:f(...)\",\"line\":2,\"items\":"));
+}
+
 TEST(PlanReport, SaysWhatRulesDidAndWhatWasMissing) {
   const std::string kept = planText("//a[b = //c/d]");
   EXPECT_THAT(kept, HasSubstr("//c/d  (line 1)"));

@@ -145,6 +145,8 @@ TEST(SessionMessages, CountLinesFromTheEntry) {
             "query\n  FLWOR  (line 3)\n    for  (line 8)");
   EXPECT_EQ(cli::withoutPrologLines("+  (line 4)", 4), "+  (line 4)");
   EXPECT_EQ(cli::withoutPrologLines("(line ) (line 9", 1), "(line ) (line 8");
+  EXPECT_EQ(cli::withoutPrologLines("a  (line 9 of file:///m.xq)\nb  (line 9)", 4),
+            "a  (line 9 of file:///m.xq)\nb  (line 5)");
 }
 
 }  // namespace

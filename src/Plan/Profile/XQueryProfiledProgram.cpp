@@ -4,13 +4,10 @@
 #include "Plan/Planning.h"
 #include "Plan/Profile/XQueryProfiledExpr.h"
 #include "Platform/Base/WorkMeter.h"
-#include "Platform/Base/XQueryPlaces.h"
+#include "Platform/Base/XQueryPlaceColumns.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
-#include "xquery/URL.h"
 
-#include <algorithm>
-#include <tuple>
 #include <utility>
 
 namespace xquery {
@@ -34,7 +31,7 @@ class Profiling {
   Profiling(XQueryPlanning& planning, const XQueryProlog& main, XQueryProfiledProgram& profiled)
       : _planning(planning),
         _program(planning.program),
-        _main(main),
+        _places(*main.modules().places()),
         _profiled(profiled),
         _isInside(_program.placeCount()) {
     for (XQueryPlaceID place = 0; place < _program.placeCount(); ++place) {
@@ -54,7 +51,12 @@ class Profiling {
         add(entry);
       }
     }
-    findColumns();
+    XQueryFindColumns(_places, _written, [&](const Written& each, const XQueryPlaceColumn& at) {
+      XQueryProfilePlace& place = _profiled.expressions[each.index].place;
+      place.line = at.line;
+      place.column = at.column;
+      place.length = at.length;
+    });
   }
 
  private:
@@ -62,31 +64,9 @@ class Profiling {
     return _program[place].slot && !_planning.isOpen(place) && !_planning.isWrapped(place);
   }
 
-  // The module and the line of an expression; findColumns knows it better where it has a place.
-  XQueryProfilePlace placeOf(XQueryPlaceID place, int64_t line) const {
-    const XQueryProlog* prolog = _program.bodyOf(place).prolog;
-    const bool isImported = prolog && prolog != &_main && prolog->moduleURL();
-    return {isImported ? prolog->moduleURL()->absoluteString()->utf8() : std::string(), line};
-  }
-
-  // In the order of the text, which is then read but once.
-  void findColumns() {
-    const XQueryPlaces& places = *_main.modules().places();
-    std::stable_sort(_written.begin(), _written.end(), [&](const Written& a, const Written& b) {
-      return std::tuple(a.module, places.span(a.number).start) <
-             std::tuple(b.module, places.span(b.number).start);
-    });
-    XQueryPlaceCursor cursor(places);
-    WorkPacer pacer;
-    for (const Written& each : _written) {
-      pacer.turn();
-      if (!cursor.goTo(each.number)) continue;
-      const XQuerySpan span = places.span(each.number);
-      XQueryProfilePlace& place = _profiled.expressions[each.index].place;
-      place.line = cursor.line();
-      place.column = cursor.column();
-      place.length = span.end - span.start;
-    }
+  // Where it has a place, the text tells the line better.
+  static XQueryProfilePlace placeOf(const XQueryPlanReport::Entry& entry) {
+    return {entry.module, entry.line};
   }
 
   // What the expression at the place is told as.
@@ -98,7 +78,7 @@ class Profiling {
     _inBody = _program.withoutParentheses(entry.place);
     _levelsLess = 0;
     const size_t index = _profiled.expressions.size();
-    _profiled.expressions.push_back({0, entry.label, {}, placeOf(entry.place, 0), {}});
+    _profiled.expressions.push_back({0, entry.label, {}, placeOf(entry), {}});
     const XQueryProgramBody& body = _program.bodyOf(entry.place);
     if (body.function || !isThereAlready(*_planning.exprAt(entry.place))) count(entry.place, index);
   }
@@ -109,7 +89,7 @@ class Profiling {
     if (entry.place == _inBody) {
       XQueryProfiledExpression& body = _profiled.expressions.back();
       body.label = entry.label;
-      body.place = placeOf(entry.place, entry.line);
+      body.place = placeOf(entry);
       body.notes = entry.notes;
       write(entry.place, _profiled.expressions.size() - 1);
       _levelsLess = 1;
@@ -118,7 +98,7 @@ class Profiling {
     if (entry.notes.empty() && isThereAlready(*_program[entry.place].expr)) return;
     const size_t index = _profiled.expressions.size();
     _profiled.expressions.push_back({entry.depth - _levelsLess, std::string(entry.role),
-                                     entry.label, placeOf(entry.place, entry.line), entry.notes});
+                                     entry.label, placeOf(entry), entry.notes});
     write(entry.place, index);
     if (isCounted(entry.place)) count(entry.place, index);
   }
@@ -155,7 +135,7 @@ class Profiling {
 
   XQueryPlanning& _planning;
   XQueryProgram& _program;
-  const XQueryProlog& _main;
+  const XQueryPlaces& _places;
   XQueryProfiledProgram& _profiled;
   std::vector<Written> _written;
   std::vector<bool> _isInside;
