@@ -81,7 +81,11 @@ void lookAtExtreme(XQueryChecking& checking, XQueryPlaceID call, std::string_vie
 
 void lookAtBaseURI(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
   const XQueryPlaceID node = checking.argument(call, 0);
-  if (node == XQueryNoPlace) return;
+  if (node == XQueryNoPlace) {
+    checking.warn(call, ID::CallDiffers,
+                  {"base-uri without an argument", "it gives that of the query, use base-uri(.)"});
+    return;
+  }
   const XQueryFacts& facts = checking.factsOf(node);
   if (facts.most > 0 && facts.are(Document)) checking.warn(call, ID::BaseURIOfDocument);
 }
@@ -175,6 +179,23 @@ std::string otherConstructIn(std::string_view pattern) {
   return {};
 }
 
+// Where white space is passed over, what stands behind "#" is, up to the end of its line.
+bool hasComment(std::string_view pattern) {
+  bool isInClass = false;
+  for (size_t i = 0; i < pattern.size(); ++i) {
+    if (pattern[i] == '\\') {
+      ++i;
+    } else if (pattern[i] == '[') {
+      isInClass = true;
+    } else if (pattern[i] == ']') {
+      isInClass = false;
+    } else if (pattern[i] == '#' && !isInClass) {
+      return true;
+    }
+  }
+  return false;
+}
+
 // Asks the engine itself. Compiling takes stack for each group, of which most patterns have few.
 void checkPattern(XQueryChecking& checking, XQueryPlaceID call, std::string_view name,
                   const NSString& pattern) {
@@ -200,7 +221,11 @@ void checkPattern(XQueryChecking& checking, XQueryPlaceID call, std::string_view
 void lookAtPattern(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
   const auto* text = checking.textIn(checking.argument(call, 1));
   if (!text) return;
-  const std::string construct = otherConstructIn(text->utf8());
+  const std::string pattern = text->utf8();
+  std::string construct = otherConstructIn(pattern);
+  const auto* flags = checking.textIn(checking.argument(call, name == "replace" ? 3 : 2));
+  const bool isExtended = flags && flags->view().find(u'x') != NSStringView::notFound;
+  if (construct.empty() && isExtended && hasComment(pattern)) construct = "#";
   if (construct.empty()) return checkPattern(checking, call, name, *text);
   checking.warn(call, ID::PatternDiffers, {construct});
 }

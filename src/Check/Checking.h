@@ -43,6 +43,8 @@ class XQueryChecking {
   // The same at a spot of a module.
   void warnAt(const XQueryProlog& module, Spot spot, ID id, Parts parts = {},
               const Ref<NSString>& name = nullptr);
+  // Whether it is asked for the first time about that place: for what is told once of a whole.
+  bool isFirstIn(XQueryPlaceID whole) { return _toldOf.insert(whole).second; }
   bool isFull() const { return _found.size() >= mostWarnings; }
   // What has been found, in order.
   std::vector<XQueryWarning> takeWarnings();
@@ -107,6 +109,7 @@ class XQueryChecking {
   static XQueryWarning warningOf(ID id, Parts parts, const Ref<NSString>& name);
 
   std::vector<Found> _found;
+  std::unordered_set<XQueryPlaceID> _toldOf;
   std::unordered_map<const XQueryProlog*, size_t> _modules;
   std::unordered_map<const NSObject*, const XQueryProgramBody*> _bodies;
   std::unordered_set<const XQueryExpr*> _waitingNames;

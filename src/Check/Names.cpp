@@ -4,6 +4,7 @@
 #include "Expr/Clauses/XQueryQuantified.h"
 #include "Expr/Constructors/XQueryAttributeExpr.h"
 #include "Expr/Constructors/XQueryElementExpr.h"
+#include "Expr/Constructors/XQueryNodeExprs.h"
 #include "Expr/Paths/XQueryNameTest.h"
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/XQueryLeaves.h"
@@ -180,11 +181,45 @@ void warnOfPrefix(XQueryChecking& checking, XQueryPlaceID place, const Ref<NSStr
   checking.warn(place, ID::UndeclaredPrefix, {prefix->utf8()}, prefix);
 }
 
+// The namespace that a constructor gives to names without a prefix; null where it says nothing of
+// them. Of attributes there are few.
+Ref<NSString> defaultNamespaceOf(const XQueryChecking& checking, XQueryPlaceID element) {
+  int parts = 0;
+  for (XQueryPlaceID part = checking.program.firstPart(element);
+       part != XQueryNoPlace && ++parts <= XQueryChecking::mostLevels;
+       part = checking.program.nextPart(part)) {
+    const auto* declaration = checking.as<XQueryNamespaceExpr>(part);
+    const Ref<NSXMLNode> node = declaration ? declaration->constantNode() : nullptr;
+    if (node && node->name()->length() == 0) return node->stringValue();
+  }
+  return nullptr;
+}
+
+// Constructors do not change what name tests find, whatever namespace they declare.
+void checkConstructorNamespace(XQueryChecking& checking, XQueryPlaceID place,
+                               const XQueryNameTest& test) {
+  const bool hasPrefix = test.name()->view().find(u':') != NSStringView::notFound;
+  if (test.attribute() || hasPrefix) return;
+  XQueryPlaceID around = checking.at(place).parent;
+  Ref<NSString> URI;
+  for (int level = 0; around != XQueryNoPlace && level < XQueryChecking::mostLevels; ++level) {
+    if (checking.as<XQueryElementExpr>(around)) URI = defaultNamespaceOf(checking, around);
+    if (URI) break;
+    around = checking.at(around).parent;
+  }
+  if (!URI) return;
+  const auto& declared = checking.program.bodyOf(place).prolog->defaultElementNamespace();
+  const bool isSame = declared ? declared->isEqualToString(*URI) : URI->length() == 0;
+  if (isSame || !checking.isFirstIn(around)) return;
+  checking.warn(place, ID::ConstructorNamespace, {test.name()->utf8()});
+}
+
 }  // namespace
 
 void XQueryCheckNameTest(XQueryChecking& checking, XQueryPlaceID place) {
   if (const auto* test = checking.as<XQueryNameTest>(place)) {
     if (test->isDeferred()) warnOfPrefix(checking, place, test->name());
+    checkConstructorNamespace(checking, place, *test);
   } else if (const auto* any = checking.as<XQueryWildCardNameTest>(place); any->mayRaise()) {
     checking.warn(place, ID::UndeclaredPrefix, {any->prefix()->utf8()}, any->prefix());
   }

@@ -194,6 +194,15 @@ const XQueryAxisStep* lastReverseStep(const XQueryPathExpr& path) {
   return last != end && last->axis() == XQueryAxisParent ? nullptr : last;
 }
 
+// From the one context item of a query upwards by one step: one node at most, though a host may
+// hand in several items.
+bool isParentOfContext(const XQueryChecking& checking, XQueryPlaceID place,
+                       const XQueryPathExpr& path) {
+  const auto* only = dyn_cast<XQueryAxisStep>(path.step());
+  return only && !only->next() && only->axis() == XQueryAxisParent &&
+         checking.at(place).focus == XQueryNoPlace && !checking.program.bodyOf(place).function;
+}
+
 }  // namespace
 
 void XQueryCheckReverseOrder(XQueryChecking& checking, const XQueryUses& uses) {
@@ -203,7 +212,7 @@ void XQueryCheckReverseOrder(XQueryChecking& checking, const XQueryUses& uses) {
     const auto* path = checking.as<XQueryPathExpr>(place);
     if (!path || checking.factsOf(place).most <= 1 || !checking.at(place).isOrdered) continue;
     const XQueryAxisStep* const step = lastReverseStep(*path);
-    if (!step || !uses.showsOrder(place)) continue;
+    if (!step || !uses.showsOrder(place) || isParentOfContext(checking, place, *path)) continue;
     checking.warn(place, ID::ReverseOrder, {labelOf(*step)});
   }
 }

@@ -19,6 +19,7 @@ enum class XQueryWarningID : uint8_t {
   LaterVariable,
   LeakedVariable,
   UndeclaredPrefix,
+  ConstructorNamespace,
   UnknownType,
   ModuleNamespace,
   // What is of no use.

@@ -91,6 +91,26 @@ TEST(CheckedNames, Prefixes) {
   EXPECT_EQ(warnings.front().name->utf8(), "p");
 }
 
+TEST(CheckedNames, TestsInsideConstructorsWithANamespace) {
+  expectWarnings({
+      {"<a xmlns='urn:a'>{\n//b }</a>", "2 constructor-namespace"},
+      {"<a xmlns='urn:a'><b>{ //c[d]/e }</b>\n{ //f }</a>", "1 constructor-namespace"},
+      {"<a xmlns='urn:a'>{ //c }<b xmlns='urn:b'>\n{ //d }</b></a>",
+       "1 constructor-namespace, 2 constructor-namespace"},
+      {"<a xmlns='urn:a' b='{ //b }'/>", "1 constructor-namespace"},
+      {"<a xmlns='urn:a'>{ //*[. instance of element(b)] }</a>", "1 constructor-namespace"},
+      {"declare default element namespace 'urn:d'; <a xmlns=''>{ //b }</a>",
+       "1 constructor-namespace"},
+      {"declare default element namespace 'urn:a'; <a xmlns='urn:a'>{ //b }</a>", ""},
+      {"<a xmlns='urn:a'><b xmlns=''>{ //c }</b></a>", ""},
+      {"<a xmlns='urn:a'>{ //@b, //*, //text() }</a>, //c", ""},
+      {"<a xmlns:p='urn:a'>{ //b }</a>", ""},
+      {"declare function local:f($d) { $d//b }; <a xmlns='urn:a'>{ local:f(/) }</a>", ""},
+  });
+  EXPECT_EQ(textOf("<a xmlns='urn:a'>{ //b }</a>"),
+            "name test b does not take the namespace of the constructor around it");
+}
+
 TEST(CheckedNames, Types) {
   expectWarnings({
       {"5 instance of xs:foo", "1 unknown-type"},
