@@ -188,10 +188,18 @@ bool checkNumber(XQueryChecking& checking, XQueryPlaceID place, const Cast& cast
   return true;
 }
 
+void checkName(XQueryChecking& checking, XQueryPlaceID place, const Cast& cast,
+               const NSObject& literal) {
+  const auto* name = dyn_cast<NSString>(&literal);
+  if (!name || !checking.hasUnknownPrefix(*name, place)) return;
+  checking.warn(place, ID::CastFails, {shown(checking, cast), cast.label});
+}
+
 void checkLiteralCast(XQueryChecking& checking, XQueryPlaceID place, const Cast& cast,
                       const NSObject& literal) {
-  // A name takes its prefix from where it stands. Diagnostics show each error as it is made.
-  if (cast.type == XQueryTypeQName || cast.type == XQueryTypeNotation || XQueryLogEnabled()) return;
+  if (cast.type == XQueryTypeQName) return checkName(checking, place, cast, literal);
+  // Diagnostics show each error as it is made.
+  if (cast.type == XQueryTypeNotation || XQueryLogEnabled()) return;
   const bool isPlain =
       literal.kind() == Kind::Null || isa<NSString>(&literal) || isa<NSNumber>(&literal);
   if (!isPlain) return;

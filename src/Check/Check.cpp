@@ -40,6 +40,8 @@ constexpr std::array rows = {
     Row{Kind::FLWORExpr, XQueryCheckFLWOR},
     Row{Kind::QuantifiedExpr, XQueryCheckQuantifier},
     Row{Kind::ElementExpr, XQueryCheckElement},
+    Row{Kind::ElementExpr, XQueryCheckComputedName},
+    Row{Kind::ComputedAttributeExpr, XQueryCheckComputedName},
     Row{Kind::DocumentExpr, XQueryCheckDocument},
 };
 

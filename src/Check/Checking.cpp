@@ -188,6 +188,12 @@ const NSString* XQueryChecking::textIn(XQueryPlaceID place) const {
   return dyn_cast<NSString>(literalIn(place));
 }
 
+bool XQueryChecking::hasUnknownPrefix(const NSString& name, XQueryPlaceID place) const {
+  const auto colon = name.view().find(u':');
+  if (colon == NSStringView::notFound || colon == 0) return false;
+  return !program.bodyOf(place).prolog->namespaceForPrefix(name.view().substring(0, colon));
+}
+
 bool XQueryChecking::givesUntypedText(XQueryPlaceID place) const {
   if (place == XQueryNoPlace) return false;
   const std::string_view name = functionCalledIn(place);

@@ -72,6 +72,9 @@ class XQueryChecking {
   const NSObject* literalIn(XQueryPlaceID place) const;
   // A literal that is a text; none for anything else.
   const NSString* textIn(XQueryPlaceID place) const;
+  // Whether the text, cast to a QName there, has a prefix that the prolog does not know: prefixes
+  // of constructors, and those that a caller makes known, are not asked.
+  bool hasUnknownPrefix(const NSString& name, XQueryPlaceID place) const;
   // Whether it is a call that gives texts as untyped values, where XQuery 1.0 has strings.
   bool givesUntypedText(XQueryPlaceID place) const;
   // Whether it is a search that may find nothing, or is nothing. Of what a variable or a function
@@ -130,6 +133,7 @@ void XQueryCheckCallName(XQueryChecking& checking, XQueryPlaceID place);
 void XQueryCheckVariable(XQueryChecking& checking, XQueryPlaceID place);
 void XQueryCheckNameTest(XQueryChecking& checking, XQueryPlaceID place);
 void XQueryCheckConstructorName(XQueryChecking& checking, XQueryPlaceID place);
+void XQueryCheckComputedName(XQueryChecking& checking, XQueryPlaceID place);
 void XQueryCheckAnyType(XQueryChecking& checking, XQueryPlaceID place);
 void XQueryCheckTest(XQueryChecking& checking, XQueryPlaceID place);
 void XQueryCheckOperator(XQueryChecking& checking, XQueryPlaceID place);

@@ -237,4 +237,12 @@ void XQueryCheckConstructorName(XQueryChecking& checking, XQueryPlaceID place) {
   }
 }
 
+// The name is cast to a QName when the constructor is evaluated.
+void XQueryCheckComputedName(XQueryChecking& checking, XQueryPlaceID place) {
+  const XQueryPlaceID name = checking.program.part(place, XQueryRole::Name);
+  const NSString* const text = name == XQueryNoPlace ? nullptr : checking.textIn(name);
+  if (!text || !checking.hasUnknownPrefix(*text, place)) return;
+  checking.warn(place, ID::CastFails, {checking.labelOf(name), "xs:QName"});
+}
+
 }  // namespace xquery

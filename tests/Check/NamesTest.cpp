@@ -91,6 +91,24 @@ TEST(CheckedNames, Prefixes) {
   EXPECT_EQ(warnings.front().name->utf8(), "p");
 }
 
+// What the caller makes known does not help them.
+TEST(CheckedNames, PrefixesOfComputedNames) {
+  expectWarnings({
+      {"<a xmlns:p='urn:p'>{\nattribute p:b { 1 } }</a>", "2 cast-fails"},
+      {"<a xmlns:p='urn:p'>{ attribute { 'p:b' } { 1 } }</a>", "1 cast-fails"},
+      {"<a xmlns:p='urn:p'>{ element { ('p:b') } { 1 } }</a>", "1 cast-fails"},
+      {"<a xmlns:p='urn:p'>{ xs:QName('p:b'), 'p:b' cast as xs:QName }</a>",
+       "1 cast-fails, 1 cast-fails"},
+      {"<a xmlns:p='urn:p'>{ element p:b { 1 } }</a>", ""},
+      {"declare namespace p = 'urn:p'; attribute p:b { 1 }, element { 'p:b' } { 1 },"
+       "xs:QName('p:b')",
+       ""},
+      {"attribute b { 1 }, attribute { 'b' } { 1 }, xs:QName('b'), xs:QName('xs:b')", ""},
+      {"for $n in //@name return element { $n } { 1 }", ""},
+  });
+  EXPECT_EQ(textOf("attribute p:b { 1 }"), "\"p:b\" cannot be cast to xs:QName");
+}
+
 TEST(CheckedNames, TestsInsideConstructorsWithANamespace) {
   expectWarnings({
       {"<a xmlns='urn:a'>{\n//b }</a>", "2 constructor-namespace"},
