@@ -181,10 +181,19 @@ void checkProfile(const Options& options) {
   std::vector<std::string> others = options.inputs;
   if (!options.queryText) others.push_back(options.queryFile);
   if (options.outputFile) others.push_back(*options.outputFile);
+  if (options.filesFrom) others.push_back(*options.filesFrom);
+  for (const Binding& document : options.documents) others.push_back(document.value);
   for (const std::string& path : others) {
     if (!isSameFile(path, *options.profileFile)) continue;
     throw WrongUsage("--profile: " + path + " is named as something else too");
   }
+}
+
+// A result may well take the place of an input, but hardly that of the query.
+void checkOutput(const Options& options) {
+  if (!options.outputFile || options.queryText) return;
+  if (!isSameFile(options.queryFile, *options.outputFile)) return;
+  throw WrongUsage("-o: " + *options.outputFile + " is the query");
 }
 
 void checkTogether(const Options& options) {
@@ -197,6 +206,7 @@ void checkTogether(const Options& options) {
     throw WrongUsage("--indent does not go with --as html and --as text");
   }
   checkProfile(options);
+  checkOutput(options);
 }
 
 ptrdiff_t readersBesideInputs(const Options& options) {
@@ -257,17 +267,26 @@ std::string_view withoutDashes(std::string_view name) {
   return name.substr(0, name.find('='));
 }
 
+// The shortest option that begins so; empty when none does.
+std::string optionThatBegins(std::string_view name) {
+  constexpr size_t leastOfStart = 3;
+  std::string found;
+  if (name.size() < leastOfStart) return found;
+  for (const OptionRow& row : optionRows()) {
+    if (!withoutDashes(row.name).starts_with(name)) continue;
+    if (found.empty() || std::string_view(row.name).size() < found.size()) found = row.name;
+  }
+  return found;
+}
+
 // The option that may have been meant; empty when none is near.
 std::string nearestOption(const std::string& wrong) {
   constexpr size_t longest = 32;
   const std::string_view name = withoutDashes(wrong);
-  constexpr size_t leastOfStart = 3;
-  std::string nearest;
+  std::string nearest = optionThatBegins(name);
   size_t least = (name.size() + 1) / 3;
-  if (name.size() > longest) return nearest;
+  if (!nearest.empty() || name.size() > longest) return nearest;
   for (const OptionRow& row : optionRows()) {
-    const bool isStart = name.size() >= leastOfStart && withoutDashes(row.name).starts_with(name);
-    if (isStart) return row.name;
     const size_t steps = distance(name, withoutDashes(row.name));
     if (steps > least || withoutDashes(row.name).size() <= steps) continue;
     if (steps == least && !nearest.empty()) continue;

@@ -146,6 +146,17 @@ TEST_F(ResultFile, MayBeTheInput) {
   EXPECT_EQ(content(), "<b/>\n");
 }
 
+TEST_F(ResultFile, MayNotBeTheQuery) {
+  write("1 + 1");
+  fs::create_symlink(path(), path("link"));
+  for (const std::string& name : {path(), path("link"), path(".") + "/out"}) {
+    const Outcome outcome = xquery({"-o", name, path()});
+    EXPECT_EQ(outcome.status, 2);
+    EXPECT_EQ(outcome.err, "xquery: -o: " + name + " is the query\nTry xquery --help.\n");
+  }
+  EXPECT_EQ(content(), "1 + 1");
+}
+
 TEST_F(ResultFile, StaysWhenTheQueryFails) {
   write("kept");
   EXPECT_EQ(xquery({"-o", path(), "-e", "1 div 0"}).status, 1);
