@@ -51,16 +51,20 @@ std::string readFile(const std::string& path, size_t mostBytes) {
   return readAll(file.get(), shownName(path), mostBytes);
 }
 
+namespace {
+
 // A script's first line, which names the command to the system, is for the query a blank one.
-static std::string withoutInterpreter(std::string text) {
+std::string withoutInterpreter(std::string text) {
   if (text.starts_with("#!")) text.erase(0, std::min(text.find('\n'), text.size()));
   return text;
 }
 
-static std::string queryBytes(const Options& options) {
+std::string queryBytes(const Options& options) {
   if (options.queryText) return *options.queryText;
   return withoutInterpreter(readFile(options.queryFile, mostQueryBytes));
 }
+
+}  // namespace
 
 Ref<NSString> queryText(const Options& options) {
   const std::string bytes = queryBytes(options);

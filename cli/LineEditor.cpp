@@ -3,6 +3,7 @@
 #include "Messages.h"
 #include "Streams.h"
 #include "TerminalSignals.h"
+#include "Width.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -14,7 +15,6 @@
 #include <langinfo.h>
 #include <poll.h>
 #include <string_view>
-#include <sys/ioctl.h>
 #include <unistd.h>
 #include <utility>
 
@@ -117,19 +117,13 @@ std::string commonStart(const std::vector<std::string>& words) {
   return start;
 }
 
-size_t columnsOfTerminal() {
-  constexpr size_t usual = 80;
-  winsize window = {};
-  return ioctl(STDOUT_FILENO, TIOCGWINSZ, &window) == 0 && window.ws_col ? window.ws_col : usual;
-}
-
 // In columns where the terminal is wide enough, on a line of their own after the one being edited.
 std::string listed(const std::vector<std::string>& words) {
   constexpr size_t mostListed = 100;
   const size_t count = std::min(words.size(), mostListed);
   size_t width = 0;
   for (size_t n = 0; n < count; ++n) width = std::max(width, words[n].size() + 2);
-  const size_t columns = std::max<size_t>(1, (columnsOfTerminal() - 1) / width);
+  const size_t columns = std::max<size_t>(1, (columnsOfTerminal(STDOUT_FILENO) - 1) / width);
   std::string text = "\n";
   for (size_t n = 0; n < count; ++n) {
     const bool isLast = n % columns == columns - 1 || n + 1 == count;

@@ -7,7 +7,6 @@
 #include <algorithm>
 #include <cstdlib>
 #include <string_view>
-#include <sys/ioctl.h>
 #include <unistd.h>
 #include <vector>
 
@@ -17,30 +16,16 @@ namespace {
 using namespace xquery;
 
 constexpr size_t mostCallsAtEachEnd = 5;
-constexpr size_t usualWidth = 80, leastWidth = 20;
+constexpr size_t leastWidth = 20;
 constexpr size_t leastText = 12;  // of a line that is cut
-
-// Of the terminal that hears it, where one does.
-size_t terminalWidth() {
-  winsize size = {};
-  const bool isKnown = ioctl(STDERR_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 0;
-  return std::max(isKnown ? size_t{size.ws_col} : usualWidth, leastWidth);
-}
-
-std::string moduleName(const XQuerySourcePlace& place, const Options& options) {
-  if (!place.moduleURL) return queryName(options);
-  const std::string URL = place.moduleURL->utf8();
-  const auto parsed = NSURL::URLWithString(place.moduleURL);
-  return parsed && parsed->scheme() == "file" ? parsed->path() : URL;
-}
 
 int64_t lineOf(const XQuerySourcePlace& place, const Options& options) {
   return place.moduleURL ? place.line : lineAsEntered(place.line, options);
 }
 
 std::string shown(const XQuerySourcePlace& place, const Options& options) {
-  return visible(moduleName(place, options)) + ":" + std::to_string(lineOf(place, options)) + ":" +
-         std::to_string(place.column);
+  return visible(moduleName(place.moduleURL, options)) + ":" +
+         std::to_string(lineOf(place, options)) + ":" + std::to_string(place.column);
 }
 
 std::string shownIn(const std::vector<XQueryErrorCall>& calls, size_t index) {
@@ -119,7 +104,7 @@ std::string sourceLines(const XQuerySourcePlace& place, const Options& options,
                         const Marks& marks) {
   const std::string number = std::to_string(lineOf(place, options));
   const size_t gutter = number.size() + 5;
-  const size_t width = terminalWidth();
+  const size_t width = std::max(columnsOfTerminal(STDERR_FILENO), leastWidth);
   const MarkedLine line = markedLine(place, std::max(width - std::min(width, gutter), leastText));
   return "\n  " + number + " | " + line.text + "\n  " + std::string(number.size(), ' ') + " | " +
          line.blanks + marks.before + line.mark + marks.after;
@@ -159,6 +144,12 @@ std::string_view nameOf(XQueryErrorCategory category) {
 std::string queryName(const Options& options) {
   if (options.queryText || options.isSession) return "query";
   return options.queryFile == "-" ? "standard input" : options.queryFile;
+}
+
+std::string moduleName(const Ref<NSString>& URL, const Options& options) {
+  if (!URL) return queryName(options);
+  const auto parsed = NSURL::URLWithString(URL);
+  return parsed && parsed->scheme() == "file" ? parsed->path() : URL->utf8();
 }
 
 int64_t lineAsEntered(int64_t line, const Options& options) {

@@ -15,6 +15,8 @@ namespace cli {
 
 // How messages name the query.
 std::string queryName(const Options& options);
+// The same of a module by its URL; of the query where that is null.
+std::string moduleName(const xquery::Ref<xquery::NSString>& URL, const Options& options);
 
 // Of a line of the query: without the lines that a session puts before what was entered.
 int64_t lineAsEntered(int64_t line, const Options& options);

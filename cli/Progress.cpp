@@ -1,11 +1,11 @@
 #include "Progress.h"
 
 #include "Streams.h"
+#include "Width.h"
 
 #include <algorithm>
 #include <cstdio>
 #include <initializer_list>
-#include <sys/ioctl.h>
 #include <unistd.h>
 #include <utility>
 
@@ -43,12 +43,6 @@ std::string duration(double seconds) {
   if (seconds < 100) return number(seconds, 0) + " s";
   if (seconds < 6000) return number(seconds / 60, 0) + " min";
   return number(seconds / 3600, 1) + " h";
-}
-
-size_t columnsOfTerminal() {
-  constexpr size_t usual = 80;
-  winsize window = {};
-  return ioctl(STDERR_FILENO, TIOCGWINSZ, &window) == 0 && window.ws_col ? window.ws_col : usual;
 }
 
 // The end of a path tells most.
@@ -130,7 +124,7 @@ void ProgressLine::show(uint64_t bytes, uint64_t whole) {
   if (now < _next) return;
   _next = now + betweenLines;
   // The last column stays free: some terminals go on to the next line behind it.
-  const size_t columns = columnsOfTerminal() - 1;
+  const size_t columns = columnsOfTerminal(STDERR_FILENO) - 1;
   write(progressText(_name, bytes, whole, now - _start, columns));
 }
 

@@ -141,14 +141,6 @@ std::string warningOfMore(const Options& options) {
 
 namespace {
 
-// As the query or the module was named.
-std::string fileOf(const Options& options, const XQueryWarning& warning) {
-  if (!warning.module) return queryName(options);
-  const Ref<NSURL> URL = NSURL::URLWithString(warning.module);
-  const bool isFile = URL && URL->scheme() == "file";
-  return isFile ? URL->path() : warning.module->utf8();
-}
-
 bool isExpected(const Options& options, const XQueryWarning& warning) {
   return warning.identifier == "undeclared-prefix" && warning.name &&
          options.namespaces.contains(warning.name->utf8());
@@ -165,7 +157,8 @@ std::string asJSON(const XQueryWarning& warning) {
 }
 
 std::string asText(const Options& options, const XQueryWarning& warning) {
-  std::string place = fileOf(options, warning) + ":" + std::to_string(warning.line) + ":";
+  std::string place =
+      moduleName(warning.module, options) + ":" + std::to_string(warning.line) + ":";
   if (warning.column > 0) place += std::to_string(warning.column) + ":";
   const std::string head = usesColor(options) ? "\033[1;35mwarning:\033[0m " : "warning: ";
   return visible(place) + " " + head + visible(warning.text->utf8()) + " [" +

@@ -4,6 +4,7 @@
 #include <unicode/utf8.h>
 
 #include <cstdint>
+#include <sys/ioctl.h>
 
 namespace cli {
 namespace {
@@ -25,6 +26,12 @@ bool isWide(UChar32 code) {
 }
 
 }  // namespace
+
+size_t columnsOfTerminal(int stream) {
+  constexpr size_t usual = 80;
+  winsize window = {};
+  return ioctl(stream, TIOCGWINSZ, &window) == 0 && window.ws_col > 0 ? window.ws_col : usual;
+}
 
 size_t widthOfCharacter(std::string_view character) {
   const auto length = static_cast<int32_t>(character.size());

@@ -1,10 +1,13 @@
-// How much room characters take on a terminal.
+// How much room there is on a terminal, and how much of it characters take.
 #pragma once
 
 #include <cstddef>
 #include <string_view>
 
 namespace cli {
+
+// Of the terminal that a standard stream leads to; 80 where it leads to none or none tells.
+size_t columnsOfTerminal(int stream);
 
 // The columns of one character in UTF-8: two for a wide one (ideographs, most emoji), none for what
 // is drawn over the one before it (accents, joiners, variation selectors), else one. What is no
