@@ -15,6 +15,7 @@ using command::Outcome;
 using command::readFile;
 using command::shell;
 using command::TemporaryDirectory;
+using command::waitUntil;
 using command::withoutPlaces;
 using command::xquery;
 using testing::HasSubstr;
@@ -182,8 +183,10 @@ TEST(Interrupt, EndsTheEvaluationAndLeavesTheResultFileAsItWas) {
       "/bin/bash", {"-mc",
                     "mkfifo \"$2\"; { echo '<a/>'; } > \"$2.xml\"; env --default-signal=INT \"$0\" "
                     "--jobs 1 -o \"$1\" -e "
-                    "'/' \"$2.xml\" \"$2\" & pid=$!; sleep 0.5; ls -A \"$3\" | wc -l; kill -INT "
-                    "$pid; wait $pid; echo $?; ls -A \"$3\" | wc -l",
+                    "'/' \"$2.xml\" \"$2\" & pid=$!; " +
+                        waitUntil("[ $(ls -A \"$3\" | wc -l) = 4 ]") +
+                        "ls -A \"$3\" | wc -l; kill -INT $pid; wait $pid; echo $?; "
+                        "ls -A \"$3\" | wc -l",
                     XQUERY_BINARY_DIR "/xquery", out, directory.path("pipe"), directory.path("")});
   EXPECT_EQ(outcome.out, "4\n130\n3\n");
   EXPECT_EQ(readFile(out), "kept");
@@ -200,10 +203,9 @@ TEST(Interrupt, EndsTheCommandByEverySignalThatIsMeantTo) {
     const std::string script =
         "ulimit -c 0; rm -f \"$2\"; mkfifo \"$2\"; echo '<a/>' > \"$2.xml\"; "
         "env --default-signal=" +
-        std::string(signal) +
-        " \"$0\" --jobs 1 -o \"$1\" -e '/' \"$2.xml\" \"$2\" & pid=$!; sleep 0.5; "
-        "ls -A \"$3\" | wc -l; kill -" +
-        signal + " $pid; wait $pid; echo $?; ls -A \"$3\" | wc -l";
+        std::string(signal) + " \"$0\" --jobs 1 -o \"$1\" -e '/' \"$2.xml\" \"$2\" & pid=$!; " +
+        waitUntil("[ $(ls -A \"$3\" | wc -l) = 4 ]") + "ls -A \"$3\" | wc -l; kill -" + signal +
+        " $pid; wait $pid; echo $?; ls -A \"$3\" | wc -l";
     const Outcome outcome =
         command::start("/bin/bash", {"-mc", script, XQUERY_BINARY_DIR "/xquery", out,
                                      directory.path("pipe"), directory.path("")});
@@ -254,11 +256,11 @@ TEST(MessageOptions, ColorWhatTheyAreAskedTo) {
 }
 
 TEST(MessageOptions, SuggestTheNearest) {
-  const std::pair<const char*, const char*> wrong[] = {{"--tpyes", "--types"},
-                                                       {"--with-names", "--with-name"},
-                                                       {"-types", "--types"},
-                                                       {"--file-from=x", "--files-from"},
-                                                       {"--seperator", "--separator"}};
+  const std::pair<const char*, const char*> wrong[] = {
+      {"--tpyes", "--types"},        {"--with-names", "--with-name"},
+      {"-types", "--types"},         {"--file-from=x", "--files-from"},
+      {"--tim", "--time"},           {"--prof", "--profile"},
+      {"--seperator", "--separator"}};
   for (const auto& [given, meant] : wrong) {
     const Outcome outcome = xquery({given, "-e", "1"});
     EXPECT_EQ(outcome.status, 2);

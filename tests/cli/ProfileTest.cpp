@@ -93,6 +93,8 @@ TEST_F(ProfileCommand, OverwritesNeitherQueryNorInputNorResult) {
       {"--profile", query, query},
       {"--profile", input, "-e", "1", path(".") + "/a.html"},
       {"--profile", path("p.json"), "-o", path("p.json"), "-e", "1"},
+      {"--profile", input, "--doc", "d=" + input, "-e", "1"},
+      {"--profile", query, "--files-from", query, "-e", "1"},
   };
   for (const auto& arguments : commands) {
     const Outcome outcome = xquery(arguments);
@@ -149,9 +151,9 @@ TEST_F(ProfileCommand, LeavesAnOldFileWhereNothingRan) {
   EXPECT_EQ(files(), 1u);
 }
 
-const std::string endless =
-    "declare function local:f($n) { if ($n < 2) then 1 else local:f($n - 1) + local:f($n - 2) };"
-    "local:f(90)";
+const std::string declaration =
+    "declare function local:f($n) { if ($n < 2) then 1 else local:f($n - 1) + local:f($n - 2) };";
+const std::string endless = declaration + "local:f(90)";
 
 TEST_F(ProfileCommand, IsWrittenAtATimeLimit) {
   const Outcome outcome = xquery({"--profile", path("p.json"), "--timeout", "0.3", "-e", endless});
@@ -161,19 +163,25 @@ TEST_F(ProfileCommand, IsWrittenAtATimeLimit) {
   EXPECT_EQ(jsonMember(content("p.json"), "failures"), "1");
 }
 
-// What becomes of the command where it is interrupted after so many seconds of the endless query;
-// "$1" is the folder.
+// What becomes of the command where it is interrupted while so many evaluations do not come to an
+// end; "$1" is the folder. Each of them tells that it has begun by a document of its own that is
+// missing.
 Outcome interrupted(const std::string& arguments, const std::string& folder,
-                    const std::string& seconds) {
-  return command::start(
-      "/bin/bash", {"-mc",
-                    "env --default-signal=INT \"$0\" --profile \"$1/p.json\" -e \"$2\" " +
-                        arguments + " & pid=$!; sleep " + seconds + "; kill -INT $pid; wait $pid",
-                    XQUERY_BINARY_DIR "/xquery", folder, endless});
+                    const std::string& nameOfMissing, int evaluations) {
+  const std::string query = declaration + "(doc(" + nameOfMissing + "), local:f(90))";
+  const std::string script =
+      "env --default-signal=INT \"$0\" --profile \"$1/p.json\" -e \"$2\" " + arguments +
+      " 2> \"$3\" & pid=$!; " +
+      command::waitUntil("[ $(grep -c 'cannot load' \"$3\") = " + std::to_string(evaluations) +
+                         " ] || ! kill -0 $pid") +
+      "kill -INT $pid; wait $pid";
+  const TemporaryDirectory told;
+  return command::start("/bin/bash", {"-mc", script, XQUERY_BINARY_DIR "/xquery", folder, query,
+                                      told.path("messages")});
 }
 
 TEST_F(ProfileCommand, IsWrittenAtAnInterrupt) {
-  const Outcome outcome = interrupted("-o \"$1/out\"", path(""), "0.7");
+  const Outcome outcome = interrupted("-o \"$1/out\"", path(""), "'none'", 1);
   EXPECT_EQ(outcome.status, 130) << outcome.err;
   EXPECT_EQ(jsonMember(content("p.json"), "evaluations"), "1");
   EXPECT_EQ(jsonMember(content("p.json"), "failures"), "1");
@@ -181,8 +189,10 @@ TEST_F(ProfileCommand, IsWrittenAtAnInterrupt) {
 }
 
 TEST_F(ProfileCommand, AtAnInterruptHasWhatAllThreadsMeasured) {
-  for (const char* name : {"a.xml", "b.xml", "c.xml"}) std::ofstream(path(name)) << "<a/>";
-  const Outcome outcome = interrupted("--jobs 3 \"$1\"/?.xml", path(""), "1.5");
+  for (const std::string name : {"a", "b", "c"}) {
+    std::ofstream(path(name + ".xml")) << "<a>no-" << name << "</a>";
+  }
+  const Outcome outcome = interrupted("--jobs 3 \"$1\"/?.xml", path(""), "string(/*)", 3);
   EXPECT_EQ(outcome.status, 130) << outcome.err;
   EXPECT_EQ(jsonMember(content("p.json"), "evaluations"), "3");
   EXPECT_EQ(jsonMember(content("p.json"), "inputs"), "3");

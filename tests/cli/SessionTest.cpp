@@ -355,6 +355,12 @@ TEST_F(Session, ShowsPlansAndTimes) {
   EXPECT_THAT(session->ask(":plan"), HasSubstr("query  any number of"));
   EXPECT_THAT(session->ask(":plan 1 + 1"), HasSubstr("(line 1)"));
   EXPECT_THAT(session->ask(":plan 1 idiv"), HasSubstr("XQueryError:3"));
+  // Lines of a module are those that it has.
+  const std::string module = write(
+      "m.xq", "module namespace m = 'urn:m';\n\n\n\ndeclare function m:f($x) {\n  $x + 1 };\n");
+  session->ask(":load " + module);
+  EXPECT_THAT(session->ask(":plan m:f(.)"),
+              AllOf(HasSubstr("m:f(...)  (line 1)"), HasSubstr("+  (line 6 of file://")));
   EXPECT_EQ(session->ask(":time"), "times are reported\n");
   EXPECT_THAT(session->ask("1"),
               AllOf(StartsWith("1\n"), HasSubstr("compile "), HasSubstr("evaluate ")));
@@ -371,7 +377,7 @@ TEST_F(Session, SurvivesAnInterruptOfAnEvaluation) {
   const auto session = begin();
   for (int turn = 0; turn < 2; ++turn) {
     session->type(std::string(endless) + "\n");
-    usleep(300'000);
+    session->waitUntilItWorks();
     session->type("\x03\x03");
     EXPECT_THAT(session->waitFor("\nxquery> "), HasSubstr("xquery: interrupted"));
     EXPECT_EQ(session->ask("1"), "1\n");
@@ -392,7 +398,7 @@ TEST_F(Session, SurvivesAnInterruptOfReading) {
   ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
   const auto session = begin();
   const auto interrupt = [&] {
-    usleep(300'000);
+    session->waitUntilItSleeps();
     session->type("\x03");
     EXPECT_THAT(session->waitFor("\nxquery> "), HasSubstr("xquery: interrupted"));
     EXPECT_EQ(session->ask("1"), "1\n");
@@ -415,7 +421,7 @@ TEST_F(Session, AnInterruptBeforeItBeginsEndsTheCommand) {
   const std::string pipe = path("pipe.xml");
   ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
   Terminal session({pipe}, environment());
-  usleep(500'000);
+  session.waitUntilItSleeps();
   session.type("\x03");
   EXPECT_EQ(session.end(), -SIGINT);
 }
@@ -439,7 +445,7 @@ TEST_F(Session, EndsWithItsTerminal) {
   // While evaluating as well.
   session = begin();
   session->type(std::string(endless) + "\n");
-  usleep(200'000);
+  session->waitUntilItWorks();
   session->hangUp();
   EXPECT_EQ(session->end(), -SIGHUP);
 }

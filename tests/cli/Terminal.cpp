@@ -5,6 +5,7 @@
 #include <cctype>
 #include <csignal>
 #include <cstdlib>
+#include <fstream>
 #include <poll.h>
 #include <pty.h>
 #include <stdexcept>
@@ -91,6 +92,35 @@ void Terminal::signal(int number) const {
 bool Terminal::isCooked() const {
   termios settings = {};
   return tcgetattr(_side, &settings) == 0 && (settings.c_lflag & ICANON) != 0;
+}
+
+void Terminal::waitUntilItWorks() {
+  waitUntil(&Terminal::isCooked, "the line is still being edited");
+}
+
+void Terminal::waitUntilItSleeps() {
+  waitUntil(&Terminal::isCooked, "the line is still being edited");
+  waitUntil(&Terminal::isAsleep, "the command is still at work");
+}
+
+// The state of a process stands behind its name, which is in parentheses.
+bool Terminal::isAsleep() const {
+  std::ifstream in("/proc/" + std::to_string(_process) + "/stat");
+  std::string status;
+  std::getline(in, status);
+  const size_t name = status.rfind(')');
+  return name != std::string::npos && status.compare(name, 3, ") S") == 0;
+}
+
+void Terminal::waitUntil(bool (Terminal::*holds)() const, const char* what) {
+  const auto end = Clock::now() + std::chrono::seconds(20);
+  while (!(this->*holds)()) {
+    if (Clock::now() > end) {
+      ADD_FAILURE() << what;
+      return;
+    }
+    readMore(milliseconds(5));
+  }
 }
 
 int Terminal::end() {

@@ -33,12 +33,19 @@ class Terminal {
   void signal(int number) const;
   // Whether the terminal makes lines of what is typed.
   bool isCooked() const;
+  // Waits until no line is being edited any more: what was entered is being evaluated, and an
+  // interrupt is a signal.
+  void waitUntilItWorks();
+  // Waits until it does that and sleeps, as what opens a pipe does that nobody writes to.
+  void waitUntilItSleeps();
   // The exit status, or minus the number of the signal; waits for the end.
   int end();
 
  private:
   // False when nothing more comes within the time.
   bool readMore(std::chrono::milliseconds time);
+  bool isAsleep() const;
+  void waitUntil(bool (Terminal::*holds)() const, const char* what);
 
   int _side = -1;
   pid_t _process = -1;
