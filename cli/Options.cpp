@@ -191,7 +191,7 @@ void checkProfile(const Options& options) {
 
 // A result may well take the place of an input, but hardly that of the query.
 void checkOutput(const Options& options) {
-  if (!options.outputFile || options.queryText) return;
+  if (!options.outputFile || options.queryText || options.queryFile == "-") return;
   if (!isSameFile(options.queryFile, *options.outputFile)) return;
   throw WrongUsage("-o: " + *options.outputFile + " is the query");
 }
