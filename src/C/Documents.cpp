@@ -43,14 +43,10 @@ xq_status readDocumentBy(xq_reading flags, xq_node** document, xq_error** error,
   if (!document) return XQ_USAGE;
   *document = nullptr;
   if (!isUsable || !areReadingFlags(flags)) return XQ_USAGE;
-  return guarded([&] {
-    try {
-      NSXMLParseError failure;
-      const Ref<NSXMLDocument> found = read(readingOptions(flags), failure);
-      return found ? giveNew(document, found) : giveError(error, failure);
-    } catch (const NSException& limit) {
-      return giveOuterLimit(error, limit);
-    }
+  return guardedWithin(error, [&] {
+    NSXMLParseError failure;
+    const Ref<NSXMLDocument> found = read(readingOptions(flags), failure);
+    return found ? giveNew(document, found) : giveError(error, failure);
   });
 }
 

@@ -59,4 +59,16 @@ xq_status giveError(xq_error** out, const NSXMLParseError& error);
 // one's limit was reached, and it will notice as soon as the callback returns.
 xq_status giveOuterLimit(xq_error** out, const NSException& limit);
 
+// As `guarded`, for what may be called in a callback, and has an error to say so.
+template <class Call>
+xq_status guardedWithin(xq_error** out, Call call) noexcept {
+  return guarded([&]() -> xq_status {
+    try {
+      return call();
+    } catch (const NSException& limit) {
+      return giveOuterLimit(out, limit);
+    }
+  });
+}
+
 }  // namespace xquery::capi

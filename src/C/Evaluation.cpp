@@ -34,17 +34,13 @@ xq_status xq_evaluate(xq_context* context, const xq_query* query, xq_value** ite
   if (!areGood(query)) return XQ_USAGE;
   const ContextUse use(context);
   if (!use) return XQ_USAGE;
-  return guarded([&]() -> xq_status {
-    try {
-      const Ref<XQuery> kept = query->query;  // a callback may free the handle
-      Ref<XQueryError> failure;
-      const auto result =
-          context->context->evaluateXQuery(*kept, context->variables, context->item, &failure);
-      if (const auto found = XQueryFirstError(result, failure)) return giveError(error, found);
-      return giveNew(items, itemsOf(result));
-    } catch (const NSException& limit) {
-      return giveOuterLimit(error, limit);
-    }
+  return guardedWithin(error, [&] {
+    const Ref<XQuery> kept = query->query;  // a callback may free the handle
+    Ref<XQueryError> failure;
+    const auto result =
+        context->context->evaluateXQuery(*kept, context->variables, context->item, &failure);
+    if (const auto found = XQueryFirstError(result, failure)) return giveError(error, found);
+    return giveNew(items, itemsOf(result));
   });
 }
 
@@ -91,14 +87,10 @@ xq_status streamBy(xq_context* context, const xq_query* query, xq_reading flags,
   if (!areGood(query) || !isUsable || !areReadingFlags(flags)) return XQ_USAGE;
   const ContextUse use(context);
   if (!use) return XQ_USAGE;
-  return guarded([&]() -> xq_status {
-    try {
-      XQueryStreamInput input;
-      input.options = readingOptions(flags);
-      return run(input);
-    } catch (const NSException& limit) {
-      return giveOuterLimit(error, limit);
-    }
+  return guardedWithin(error, [&] {
+    XQueryStreamInput input;
+    input.options = readingOptions(flags);
+    return run(input);
   });
 }
 

@@ -33,18 +33,14 @@ xq_status xq_compile(const char* text, size_t length, const xq_options* options,
   *query = nullptr;
   const GivenText source(text, length);
   if (!source.isGood() || (options && !areGood(options))) return XQ_USAGE;
-  return guarded([&]() -> xq_status {
+  return guardedWithin(error, [&] {
     const XQueryWay way = options ? options->way : XQueryWay::Planned;
     // Copies: the loader may change the options, or free them.
     const XQueryLoading loading = options ? options->loading : XQueryLoading();
     const XQueryLimits limits = options ? options->limits : XQueryLimits();
-    try {
-      const auto compiled = XQuery::xqueryWithSource(source.view(), loading, limits, way);
-      if (const auto errors = compiled->parseErrors()) return giveErrors(error, errors);
-      return giveNew(query, compiled, way);
-    } catch (const NSException& limit) {
-      return giveOuterLimit(error, limit);
-    }
+    const auto compiled = XQuery::xqueryWithSource(source.view(), loading, limits, way);
+    if (const auto errors = compiled->parseErrors()) return giveErrors(error, errors);
+    return giveNew(query, compiled, way);
   });
 }
 
