@@ -17,6 +17,10 @@ class MarkedText {
     _end = end;
   }
   const char* end() const { return _end; }
+  // For somebody who reads from there again.
+  void goBack(const char* to) {
+    if (to < _block) start(to, _end);
+  }
 
   // The first byte from `at` on that may end a run of text, a value or a name; `end()` if none
   // does. What is not ASCII before it makes `wide` something else than zero.

@@ -69,6 +69,39 @@ class ProjectedElements {
     if (isBuilt) _built = _open.size();
     return isBuilt;
   }
+
+  // --- elements that are not put into the tree at once ------------------------------------------
+
+  // Where an element of that name opens that is not, whatever its attributes are, but for those of
+  // its scope: the state of what is below it. Null where it may be.
+  States::State* stateIfWaiting(States::NameID nameID) {
+    if (isDead()) return _states.dead();
+    if (_open.empty()) return nullptr;
+    States::State* const state = _states.below(_state, nameID);
+    return state->mayWait() ? state : nullptr;
+  }
+  // It opens.
+  void openWaiting(States::State* state, const Name& name) {
+    _tree.endText();
+    if (isDead() || state == _states.dead()) {
+      ++_dead;
+      return;
+    }
+    _open.push_back({_state, false, name});
+    _state = state;
+  }
+  // An element closes, unless it is in the tree.
+  bool closeIfWaiting() {
+    if (isDead()) {
+      --_dead;
+      return true;
+    }
+    if (_open.back().isBuilt) return false;
+    _state = _open.back().outside;
+    _open.pop_back();
+    return true;
+  }
+
   // Puts the elements that wait into the tree, with `build(name)` for each.
   template <class Build>
   void buildAbove(const Build& build) {

@@ -23,6 +23,15 @@ class ProjectedTags {
   void open(ReadName& name, const ReadTag& tag);
   // Whether the element that closes is in the tree.
   bool close() { return _elements.close(); }
+
+  // Of elements that are not put into the tree at once, as ProjectedElements has them.
+  using State = XMLProjectionStates::State;
+  State* stateIfWaiting(const ReadName& name) { return _elements.stateIfWaiting(name.selected); }
+  void openWaiting(State* state, ReadName& name) {
+    _elements.openWaiting(state, {&name, name.prefix->bound});
+  }
+  bool closeIfWaiting() { return _elements.closeIfWaiting(); }
+
   // Before something below the open elements goes into the tree.
   void buildAbove();
 
@@ -33,7 +42,6 @@ class ProjectedTags {
     const ReadNamespace* URI;
   };
   using Elements = ProjectedElements<Waiting>;
-  using State = Elements::States::State;
 
   void build(const Waiting& element);
   static bool hasNeededAttribute(const ReadTag& tag, const State& state);

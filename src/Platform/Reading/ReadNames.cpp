@@ -7,6 +7,7 @@
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/ReservedNamespaces.h"
 
+#include <algorithm>
 #include <bit>
 
 namespace xquery {
@@ -61,12 +62,6 @@ uint64_t hashOf(std::string_view bytes) {
   return hashOf(bytes, Head(bytes.data(), bytes.size(), bytes.data() + bytes.size()));
 }
 
-bool isRest(const ReadName& name, const char* place) {
-  return name.bytes.size() <= headBytes ||
-         std::memcmp(place + headBytes, name.bytes.data() + headBytes,
-                     name.bytes.size() - headBytes) == 0;
-}
-
 // A name or URI in the form in which it is interned.
 class InternText {
  public:
@@ -106,32 +101,22 @@ ReadName* ReadNames::find(const char* begin, const char* end, const char* textEn
   const std::string_view bytes(begin, length);
   const uint64_t hash = hashOf(bytes, head);
   ReadName* const found = _names.find(hash, [&](const ReadName& name) {
-    return head == name.head && name.bytes.size() == length && isRest(name, begin);
+    return head == name.head && name.bytes.size() == length && isRest(name, begin, textEnd);
   });
   _last->follower = found ? found : add(bytes, hash, head.words);
   return _last = _last->follower;
 }
 
-namespace {
-
-// Of the bytes that may stand behind a name in a tag.
-bool endsName(char byte) {
-  return isXMLSpace(byte) || byte == '=' || byte == '>' || byte == '/';
+bool ReadNames::isAtEnd(const ReadName& name, const char* place, const char* textEnd) {
+  return std::string_view(place, static_cast<size_t>(textEnd - place)).starts_with(name.bytes);
 }
 
-}  // namespace
-
-ReadName* ReadNames::likely(const char* begin, const char* textEnd) {
-  ReadName* const name = _last->follower;
-  if (!name || static_cast<size_t>(textEnd - begin) <= name->bytes.size()) return nullptr;
-  if (!endsName(begin[name->bytes.size()]) || !isAt(*name, begin, textEnd)) return nullptr;
-  return _last = name;
-}
-
-bool ReadNames::isAt(const ReadName& name, const char* place, const char* textEnd) {
+// Of one whose first bytes stand there.
+bool ReadNames::isRest(const ReadName& name, const char* place, const char* textEnd) {
   const size_t length = name.bytes.size();
-  if (static_cast<size_t>(textEnd - place) < length) return false;
-  return Head(place, length, textEnd) == name.head && isRest(name, place);
+  return length <= headBytes ||
+         (static_cast<size_t>(textEnd - place) >= length &&
+          std::memcmp(place + headBytes, name.bytes.data() + headBytes, length - headBytes) == 0);
 }
 
 ReadName* ReadNames::add(std::string_view bytes, uint64_t hash, const uint64_t (&head)[2]) {
@@ -141,6 +126,12 @@ ReadName* ReadNames::add(std::string_view bytes, uint64_t hash, const uint64_t (
   name->hash = hash;
   name->head[0] = head[0];
   name->head[1] = head[1];
+  const auto ones = [&](size_t from) {
+    const size_t count = std::min(bytes.size() - std::min(bytes.size(), from), sizeof(uint64_t));
+    return count == sizeof(uint64_t) ? ~uint64_t{0} : (uint64_t{1} << 8 * count) - 1;
+  };
+  name->masks[0] = ones(0);
+  name->masks[1] = ones(sizeof(uint64_t));
   name->bytes = _memory.copy(bytes);
   name->hasPrefix = shape.colon != 0;
   name->isOfXML = bytes.starts_with("xml:");

@@ -12,6 +12,7 @@
 #include "Platform/Reading/NotTaken.h"
 #include "Platform/Tree/Names.h"
 
+#include <cstring>
 #include <functional>
 
 namespace xquery {
@@ -39,7 +40,8 @@ struct ReadName {
   };
 
   uint64_t hash = 0;
-  uint64_t head[2] = {};  // its first bytes, then zeros
+  uint64_t head[2] = {};   // its first bytes, then zeros
+  uint64_t masks[2] = {};  // ones where it has bytes
   std::string_view bytes;
   ReadPrefix* prefix = nullptr;  // the empty one if there is none
   bool hasPrefix = false;
@@ -65,9 +67,35 @@ class ReadNames {
   // The entry of the name between the two places; nothing at `textEnd` is read.
   ReadName* find(const char* begin, const char* end, const char* textEnd);
   // The same without knowing where it ends, for what is likely to stand there; null for: find it.
-  ReadName* likely(const char* begin, const char* textEnd);
+  ReadName* likely(const char* begin, const char* textEnd) {
+    ReadName* const name = _last->follower;
+    if (!name || static_cast<size_t>(textEnd - begin) <= name->bytes.size()) return nullptr;
+    if (!endsName(begin[name->bytes.size()]) || !isAt(*name, begin, textEnd)) return nullptr;
+    return _last = name;
+  }
+  // The name that was found last, and what is likely to follow it; for somebody who finds what
+  // stands behind it again.
+  ReadName* last() const { return _last; }
+  void goBack(ReadName* to) { _last = to; }
+  // Whether the byte may stand behind a name in a tag.
+  static bool endsName(char byte) {
+    constexpr uint64_t ends = uint64_t{1} << '\t' | uint64_t{1} << '\n' | uint64_t{1} << '\r' |
+                              uint64_t{1} << ' ' | uint64_t{1} << '=' | uint64_t{1} << '>' |
+                              uint64_t{1} << '/';
+    const auto place = static_cast<unsigned char>(byte);
+    return place < 64 && (ends >> place & 1) != 0;
+  }
   // Whether the name stands at the place, in such a text.
-  static bool isAt(const ReadName& name, const char* place, const char* textEnd);
+  static bool isAt(const ReadName& name, const char* place, const char* textEnd) {
+    if (static_cast<size_t>(textEnd - place) < sizeof name.head) {
+      return isAtEnd(name, place, textEnd);
+    }
+    uint64_t words[2];
+    std::memcpy(words, place, sizeof words);
+    const uint64_t others =
+        ((words[0] & name.masks[0]) ^ name.head[0]) | ((words[1] & name.masks[1]) ^ name.head[1]);
+    return others == 0 && (name.bytes.size() <= sizeof words || isRest(name, place, textEnd));
+  }
   const NSXMLName* elementName(ReadName& name);
   const NSXMLName* attributeName(ReadName& name);
   const NSXMLName* target(std::string_view bytes);  // of an instruction
@@ -106,6 +134,8 @@ class ReadNames {
     const ReadNamespace* before;
   };
 
+  static bool isAtEnd(const ReadName& name, const char* place, const char* textEnd);
+  static bool isRest(const ReadName& name, const char* place, const char* textEnd);
   ReadName* targetEntry(std::string_view bytes);
   ReadName* add(std::string_view bytes, uint64_t hash, const uint64_t (&head)[2]);
   ReadPrefix* prefixOf(std::string_view bytes);

@@ -86,6 +86,8 @@ class XMLProjectionStates {
     bool needsAttributes = false;    // all of them
     bool needsInstructions = false;  // that are children
     std::vector<NameID> attributes;
+    // Whether an element is put into the tree for nothing but what is below it.
+    bool mayWait() const { return !needsItself && !needsAnyAttribute(); }
     // An element that has one of them is in the tree.
     bool needsAnyAttribute() const { return needsAttributes || !attributes.empty(); }
     bool needsAttribute(NameID name) const {

@@ -10,6 +10,7 @@
 #include "Platform/Reading/MarkedText.h"
 #include "Platform/Reading/NotTaken.h"
 #include "Platform/Reading/ProjectedTags.h"
+#include "Platform/Reading/SkippedElements.h"
 #include "Platform/Reading/XMLCharacters.h"
 #include "Platform/Reading/XMLPieces.h"
 #include "Platform/Reading/XMLProlog.h"
@@ -42,6 +43,7 @@ class XMLReader {
   XMLReader(TextSource& source, uint32_t options, const XMLProjection& projection)
       : _source(source), _tree(options, bytesBeforeAny), _names(_tree.tree()) {
     _projected.emplace(_tree, _names, _texts, projection);
+    _skipped.emplace(_text, _names, _texts, _tree, *_projected);
   }
   NSXMLDocument* read();
 
@@ -100,8 +102,8 @@ class XMLReader {
   MarkedText _text;
   const char* _at = nullptr;
   const char* _end = nullptr;
-  std::vector<ReadName*, ValueAllocator<ReadName*>> _open;  // the elements
-  ReadTag _tag;                                             // that is being read
+  SkippedElements::OpenNames _open;  // the elements
+  ReadTag _tag;                      // that is being read
   AttributeSet _distinct;
   bool _hasBegun = false;
   bool _hasType = false;
@@ -109,6 +111,7 @@ class XMLReader {
 
   static constexpr size_t bytesBeforeAny = size_t{1} << 14;
   std::optional<ProjectedTags> _projected;
+  std::optional<SkippedElements> _skipped;
 
   bool _isByPieces = false;
   const char* _pieceStart = nullptr;  // of the last one
@@ -160,7 +163,11 @@ bool XMLReader::readNextPiece() {
 
 const char* XMLReader::readPiece(const char* at) {
   if (!_hasBegun) return readProlog(at);
-  if (*at == '<') return readMarkup(at);
+  if (*at == '<') {
+    const bool maySkip = _skipped && !_open.empty();
+    const char* const next = maySkip ? _skipped->skip(at, _open) : at;
+    return next == at ? readMarkup(at) : next;
+  }
   return _open.empty() ? readSpaceAround(at) : readText(at);
 }
 

@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <random>
 #include <string>
 #include <vector>
 
@@ -241,6 +242,88 @@ TEST(XMLProjection, DocumentsThatEndEarlyAreRefusedAsEver) {
   for (size_t size = 0; size <= text.size(); ++size) {
     expectSameOutcome(std::string_view(text).substr(0, size));
   }
+}
+
+// Each byte of a document in turn is another one, or gone, or there is one more.
+TEST(XMLProjection, WhateverOneByteMakesOfADocumentIsReadOrRefusedAsEver) {
+  const std::string text =
+      "<r xmlns:p='u'><a x='1' p:y=\"2\" >t<b/></a ><x p:q='3'><c/>u<p:d z='>'>v</p:d></x>\n</r>";
+  for (size_t at = 0; at < text.size(); ++at) {
+    std::string without = text;
+    expectSameOutcome(without.erase(at, 1));
+    for (const char byte : {'<', '>', '/', ' ', '&', 'x', ':', '=', '"', '\'', '!', '\xC3'}) {
+      std::string other = text;
+      other[at] = byte;
+      expectSameOutcome(other);
+      std::string more = text;
+      expectSameOutcome(more.insert(at, 1, byte));
+    }
+  }
+}
+
+TEST(XMLProjection, RowsOfElementsAreMadeAlikeInBothWays) {
+  const std::string_view words[] = {
+      "<b>",
+      "</b>",
+      "<b/>",
+      "<a x='1'>",
+      "</a>",
+      "<a x='1' y='2'/>",
+      "<c>",
+      "</c>",
+      "<p:c>",
+      "</p:c>",
+      "<p:b p:x='1' q:x='2'/>",
+      "text",
+      "\xC3\xA9",
+      "&lt;",
+      "<!--b-->",
+      "<?p b?>",
+      "<![CDATA[<b>]]>",
+      "<c p:x='1' xmlns:p='v'>",
+      "<b xml:lang='e'/>",
+      "<c >",
+      "</c\n>",
+      "<c  x = '1' />",
+      "\n ",
+  };
+  std::mt19937 random(1);
+  const auto below = [&](size_t limit) {
+    return std::uniform_int_distribution<size_t>(0, limit - 1)(random);
+  };
+  size_t read = 0;
+  for (int i = 0; i < 3000; ++i) {
+    std::string text = "<r xmlns:p='u' xmlns:q='w'>";
+    std::vector<std::string> open;
+    for (size_t left = 1 + below(12); left > 0; --left) {
+      const std::string word(words[below(std::size(words))]);
+      // Mostly what is open is closed, and nothing else.
+      if (word.starts_with("</")) {
+        if (!open.empty()) text += "</" + open.back() + word.substr(word.find_first_of(">\n"));
+        if (!open.empty()) open.pop_back();
+        continue;
+      }
+      text += word;
+      const bool opens =
+          word[0] == '<' && word[1] != '!' && word[1] != '?' && !word.ends_with("/>");
+      if (opens) open.push_back(word.substr(1, word.find_first_of(" >") - 1));
+    }
+    for (; !open.empty(); open.pop_back()) text += "</" + open.back() + ">";
+    text += "</r>";
+    expectSameOutcome(text);
+    NSXMLParseError error;
+    if (!readProjected(text, nullptr, XMLWay::Own, 0, error)) continue;
+    ++read;
+    for (const auto& paths : someProjections) {
+      const std::string whole = madeOf(text, paths);
+      const XMLProjection projection = projectionOf(paths);
+      TextSource source(inPieces(text, 1 + i % 9), {}, 1 + i % 9, 1 + i % 9);
+      const auto document =
+          readDocument(source, NSXMLNodePreserveWhitespace, error, XMLWay::Own, &projection);
+      ASSERT_EQ(shown(document.get()), whole) << text;
+    }
+  }
+  EXPECT_GT(read, 2000U);
 }
 
 TEST(XMLProjection, WindowsOfAnySizeMakeTheSame) {
