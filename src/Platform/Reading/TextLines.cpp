@@ -40,8 +40,8 @@ std::string_view takeTo(std::string_view& text, std::string_view end) {
 }
 
 // libxml2 compares the name in an end tag with that of the start tag byte by byte, and where they
-// are the same counts a column for each byte.
-int64_t moreColumnsOfEndTags(std::string_view text) {
+// are the same counts a column for each byte. Of a text between pieces, from a place on.
+int64_t moreColumnsOfEndTags(std::string_view text, const char* from) {
   struct Construct {
     std::string_view start, end;
   };
@@ -56,7 +56,9 @@ int64_t moreColumnsOfEndTags(std::string_view text) {
       text.remove_prefix(found->start.size());
       takeTo(text, found->end);
     } else if (text.starts_with("</")) {
-      more += countContinuing(takeTo(text, ">"));
+      const bool isCounted = text.data() >= from;
+      const std::string_view tag = takeTo(text, ">");
+      if (isCounted) more += countContinuing(tag);
     } else {
       text.remove_prefix(1);
     }
@@ -72,14 +74,13 @@ void TextPlace::pass(std::string_view text) {
 
 void TextPlace::pass(std::string_view text, int64_t lines) {
   line += lines;
-  if (lines > 0) {
-    column = 1;
-    text.remove_prefix(text.rfind('\n') + 1);
-  }
-  const int64_t continuing = countContinuing(text);
-  column += static_cast<int64_t>(text.size()) - continuing;
-  // Most texts are ASCII. What a window cuts in two is counted as its parts are.
-  if (continuing > 0) column += moreColumnsOfEndTags(text);
+  const size_t begin = lines > 0 ? text.rfind('\n') + 1 : 0;
+  if (lines > 0) column = 1;
+  const std::string_view inLine = text.substr(begin);
+  const int64_t continuing = countContinuing(inLine);
+  column += static_cast<int64_t>(inLine.size()) - continuing;
+  // Most texts are ASCII. A comment may have begun on a line before.
+  if (continuing > 0) column += moreColumnsOfEndTags(text, inLine.data());
 }
 
 void TextLines::leave(std::string_view text, size_t depth) {
