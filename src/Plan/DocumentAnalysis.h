@@ -9,6 +9,7 @@
 #pragma once
 
 #include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Plan/FactsAnalysis.h"
 #include "Plan/Program.h"
 

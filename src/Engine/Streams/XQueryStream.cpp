@@ -5,6 +5,8 @@
 //       XQueryStreamFolding  puts the values together, and emits what is known of the result
 //         receiver         the host
 //
+// There may be several such parts, and an expression around them, which is evaluated at the end.
+//
 // Before the next record is made nobody may refer to the one before. What the engine itself keeps
 // between two evaluations of an expression is dropped here: the frame of local variables, kept
 // values, the focus where an error left it. What the folding keeps is apart from the document. So
@@ -18,6 +20,7 @@
 #include "Engine/BaseURIDecoration.h"
 #include "Engine/Streams/XQueryStreamFolding.h"
 #include "Engine/XQueryInternal.h"
+#include "Expr/XQueryAsking.h"
 #include "Expr/XQuerySequence.h"
 #include "Platform/Base/HostFailure.h"
 #include "Platform/Reading/InputFile.h"
@@ -29,6 +32,7 @@
 #include "xquery/Stream.h"
 
 #include <cstring>
+#include <deque>
 #include <optional>
 #include <utility>
 
@@ -40,15 +44,18 @@ bool cannotGoBack() {
   return false;
 }
 
-// The names of the way to the records, as the context resolves them.
-class RecordPath {
+// The names of the ways to the records, as the context resolves them.
+class RecordPaths {
  public:
-  RecordPath(const XQueryStreamProgram& program, XQueryContext& context) {
-    for (const XQueryStreamProgram::Step& step : program.record) {
-      _steps.push_back({step.isAnywhere, step.name ? nameOf(*step.name, context) : nullptr});
+  RecordPaths(const XQueryStreamProgram& program, XQueryContext& context) {
+    for (const auto& record : program.records) {
+      XMLRecordPath& path = _paths.emplace_back();
+      for (const XQueryStreamProgram::Step& step : record) {
+        path.push_back({step.isAnywhere, step.name ? nameOf(*step.name, context) : nullptr});
+      }
     }
   }
-  std::span<const XMLRecordStep> steps() const { return _steps; }
+  std::span<const XMLRecordPath> paths() const { return _paths; }
 
  private:
   const NSXMLExpandedName* nameOf(const XQueryNameTest& test, XQueryContext& context) {
@@ -60,7 +67,7 @@ class RecordPath {
     return _names.back().get();
   }
 
-  std::vector<XMLRecordStep> _steps;
+  std::vector<XMLRecordPath> _paths;
   std::vector<NSXMLExpandedNameRef> _names;  // that the steps refer to
 };
 
@@ -116,30 +123,64 @@ class Stream {
     UnpackedInput unpacked(read, cannotGoBack);
     TextSource source(unpacked.input(), cannotGoBack);
     source.takeAsItComes();
-    const RecordPath path(_program, _context);
-    XMLRecords records(source, path.steps(), _input.options);
+    const RecordPaths paths(_program, _context);
+    XMLRecords records(source, paths.paths(), _input.options);
     const FormerFocus former(_internal);
-    XQueryStreamFolding folding(_program, _context,
-                                [this](const Value& item) { return emit(item); });
+    makeFoldings();
     NSXMLParseError error;
-    const bool isWellFormed = evaluateAll(records, folding, error);
+    const bool isWellFormed = evaluateAll(records, error);
     if (_hasFailed) return {};
     if (!isWellFormed) {
       if (!unpacked.failure().empty()) return fail(unpacked.failure());
       _failure.reading = error;
       return {};
     }
-    return _firstError ? _firstError : folding.result();
+    return _firstError ? _firstError : result();
+  }
+
+  void makeFoldings() {
+    XQueryStreamFolding::Emit emitOne;
+    if (!_program.around) emitOne = [this](const Value& item) { return emit(item); };
+    for (const XQueryStreamProgram::Part& part : _program.parts) {
+      _foldings.emplace_back(part, _context, emitOne);
+    }
+  }
+
+  // Of what stands around the folds, where anything does.
+  Value result() {
+    if (!_program.around) return _foldings.front().result();
+    int64_t variable = _program.firstVariable;
+    for (XQueryStreamFolding& folding : _foldings) {
+      const Ref<XQueryError> former = _internal.error();
+      Value value = NSNull::null();
+      if (!folding.failure()) {
+        value = XQueryAsk(folding.each(), _context, [&] { return folding.result(); });
+      }
+      if (!value && !keepFailure(folding, former)) return {};
+      if (!value) value = NSNull::null();
+      const Value failure = folding.failure() ? Value(folding.failure()) : Value(NSNull::null());
+      _internal.setVariable(std::move(value), variable++);
+      _internal.setVariable(failure, variable++);
+    }
+    return _program.around->evaluateWithContext(_context);
+  }
+
+  // For whoever asks for the value. False where the failure is one of the whole.
+  bool keepFailure(XQueryStreamFolding& folding, const Ref<XQueryError>& former) {
+    if (!_internal.isFailing() || folding.isSure() || _internal.isFailingForGood()) return false;
+    folding.setFailure(_internal.tracedError());
+    _internal.passOverFailure(former);
+    return true;
   }
 
   // False, with the error, where the document is not well formed.
-  bool evaluateAll(XMLRecords& records, XQueryStreamFolding& folding, NSXMLParseError& error) {
+  bool evaluateAll(XMLRecords& records, NSXMLParseError& error) {
     _internal._setInScopeVariables(nullptr);
     _internal.setContextItem(records.document(), 1);
     const uint32_t references = records.references();
     const auto receive = [&](const NSXMLElement& record) {
       if (_input.beforeRecord) _input.beforeRecord(record, records.elementsKept());
-      if (!evaluateRecord(folding)) return false;
+      if (!evaluateRecord()) return false;
       _internal._setInScopeVariables(nullptr);
       _internal.clearKept();
       _internal.forgetManyFailures();
@@ -153,13 +194,29 @@ class Stream {
   }
 
   // False after an error.
-  bool evaluateRecord(XQueryStreamFolding& folding) {
-    const Value value = _program.each->evaluateWithContext(_context);
-    _hasFailed = XQueryHasFailed(value, _context);
-    if (_hasFailed) return false;
-    _isDecided = value && !folding.add(value);
-    _hasFailed = _internal.isFailing();
+  bool evaluateRecord() {
+    _isDecided = true;
+    for (XQueryStreamFolding& folding : _foldings) {
+      if (!folding.isDecided() && !evaluateRecordFor(folding)) return false;
+      _isDecided = _isDecided && folding.isDecided();
+    }
+    return true;
+  }
+  bool evaluateRecordFor(XQueryStreamFolding& folding) {
+    const Ref<XQueryError> former = _internal.error();
+    const Value value = folding.each().evaluateWithContext(_context);
+    if (value) add(value, folding);
+    _hasFailed = _internal.isFailing() && !keepFailure(folding, former);
     return !_hasFailed;
+  }
+
+  // Where somebody may pass over a failure nothing is handed out yet.
+  void add(const Value& value, XQueryStreamFolding& folding) {
+    if (!_program.around) {
+      folding.add(value);
+      return;
+    }
+    static_cast<void>(XQueryAsk(folding.each(), _context, [&] { return folding.add(value); }));
   }
 
   bool emit(const Value& item) {
@@ -178,6 +235,7 @@ class Stream {
   const XQueryStreamInput& _input;
   const XQueryContext::StreamReceiver& _receive;
   XQueryStreamFailure& _failure;
+  std::deque<XQueryStreamFolding> _foldings;  // of the parts
   bool _hasEmitted = false;
   bool _hasFailed = false;
   bool _isDecided = false;  // before the end of the document

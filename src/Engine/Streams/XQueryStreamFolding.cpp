@@ -35,8 +35,8 @@ Value apartFromDocument(Value item) {
 
 }  // namespace
 
-bool XQueryStreamFolding::add(const Value& value) {
-  switch (_program.fold) {
+bool XQueryStreamFolding::fold(const Value& value) {
+  switch (_part.fold) {
     case XQueryStreamFold::Items:
       return emitAll(value);
     case XQueryStreamFold::Part:
@@ -73,11 +73,11 @@ bool XQueryStreamFolding::emitAll(const Value& value) {
 
 bool XQueryStreamFolding::emitPart(const Value& value) {
   const XQueryItemList items(value.get());
-  for (size_t index = 0; index < items.count() && _count < _program.last; ++index) {
+  for (size_t index = 0; index < items.count() && _count < _part.last; ++index) {
     checkWork();
-    if (++_count >= _program.first && !_emit(items[index])) return false;
+    if (++_count >= _part.first && !_emit(items[index])) return false;
   }
-  return _count < _program.last;
+  return _count < _part.last;
 }
 
 // As the function does: an untyped item has the text of the string that takes its place.
@@ -94,7 +94,7 @@ bool XQueryStreamFolding::emitDistinct(const Value& value) {
     }
     if (!_met.insert(*item)) continue;
     _distinct.push_back(item);
-    if (!_emit(item)) return false;
+    if (_emit && !_emit(item)) return false;
   }
   return true;
 }
@@ -110,7 +110,7 @@ Value XQueryStreamFolding::withFormer(const Value& value) const {
 bool XQueryStreamFolding::carryOn(const Value& value) {
   if (XQueryItemList(value.get()).count() == 0) return true;
   const Value items = withFormer(value);
-  _value = _program.call->callBuiltInWith(&items, 1, _context);
+  _value = _part.call->callBuiltInWith(&items, 1, _context);
   if (_value) _value = apartFromDocument(std::move(_value));
   return static_cast<bool>(_value);
 }
@@ -121,7 +121,7 @@ bool XQueryStreamFolding::addToAverage(const Value& value) {
   _count += number;
   const Value items = withFormer(value);
   _value = fn_sum(&items, 1, _context);
-  if (!_value) static_cast<void>(_program.call->failInvalidArguments(_context));
+  if (!_value) static_cast<void>(_part.call->failInvalidArguments(_context));
   return static_cast<bool>(_value);
 }
 
@@ -138,17 +138,24 @@ bool XQueryStreamFolding::decide(const Value& value, bool deciding) {
   return false;
 }
 
+Value XQueryStreamFolding::allDistinct() const {
+  XQueryGatherer gathered;
+  for (const Value& item : _distinct) gathered.add(item);
+  return normalised(gathered.value());
+}
+
 Value XQueryStreamFolding::result() {
   const Value empty = NSNull::null();
-  switch (_program.fold) {
+  switch (_part.fold) {
     case XQueryStreamFold::Items:
     case XQueryStreamFold::Part:
-    case XQueryStreamFold::Distinct:
       return empty;
+    case XQueryStreamFold::Distinct:
+      return _emit ? empty : allDistinct();
     case XQueryStreamFold::Sum:
     case XQueryStreamFold::Least:
     case XQueryStreamFold::Greatest:
-      return _value ? _value : _program.call->callBuiltInWith(&empty, 1, _context);
+      return _value ? _value : _part.call->callBuiltInWith(&empty, 1, _context);
     case XQueryStreamFold::Average:
       return _value ? XQueryAverageOf(_value, _count, _context) : empty;
     case XQueryStreamFold::Count:

@@ -1,6 +1,10 @@
 #include "Engine/Streams/XQueryStreamProgram.h"
 
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Clauses/XQueryFLWOR.h"
+#include "Expr/XQueryLists.h"
 #include "Plan/FactsAnalysis.h"
+#include "Plan/Operators/XQueryPlannedExpr.h"
 #include "Plan/Plan.h"
 #include "Plan/Program.h"
 #include "Plan/Rules/PlaceInside.h"
@@ -8,6 +12,9 @@
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Types/XQueryErrors.h"
+
+#include <algorithm>
+#include <utility>
 
 namespace xquery {
 
@@ -25,21 +32,91 @@ Ref<XQueryError> refusalOf(const XQueryProgram& program, const XQueryStreamPlan&
   return XQueryError::errorInModule(*error, prolog->moduleURL()->absoluteString());
 }
 
-std::unique_ptr<XQueryStreamProgram> programOf(const XQueryProgram& program,
+// In the place of a fold, when all else is evaluated: the value that it has come to, or its
+// failure. In an evaluation that is not one of a stream it is the fold.
+class FoldedExpr final : public XQueryPlannedExpr {
+ public:
+  FoldedExpr(Ref<XQueryExpr> plain, int64_t variable)
+      : XQueryPlannedExpr(std::move(plain)), _variable(variable) {}
+
+  Value computeValue(XQueryContext& context) const override {
+    auto& dynamic = _internal(context);
+    const Value value = dynamic.variableForID(_variable);
+    if (!value) return plain().evaluateWithContext(context);
+    auto* const error = dyn_cast<XQueryError>(dynamic.variableForID(_variable + 1));
+    return error ? dynamic.fail(Ref<XQueryError>(error), 0) : value;
+  }
+
+ private:
+  const int64_t _variable;
+};
+
+// Behind all that the program has.
+int64_t firstFreeVariable(const XQueryProgram& program) {
+  int64_t last = 0;
+  for (XQueryPlaceID place = 0; place < program.placeCount(); ++place) {
+    const XQueryExpr* const expr = program[place].expr;
+    if (const auto* clause = dyn_cast<XQueryBindingExpr>(expr)) {
+      last = std::max(last, clause->varID());
+    }
+    if (const auto* clause = dyn_cast<XQueryForExpr>(expr)) {
+      last = std::max(last, clause->posVarID());
+    }
+  }
+  return last + 1;
+}
+
+XQueryStreamProgram::Part partOf(const XQueryProgram& program, const XQueryStreamPart& part) {
+  return {part.fold,
+          part.first,
+          part.last,
+          part.isSure,
+          Ref<XQueryExpr>(program[part.each].expr),
+          Ref<XQueryFunctionCall>(dyn_cast<XQueryFunctionCall>(program[part.place].expr))};
+}
+
+std::unique_ptr<XQueryStreamProgram> programOf(XQueryProgram& program,
                                                const XQueryStreamPlan& plan) {
   auto result = std::make_unique<XQueryStreamProgram>();
-  for (const XQueryStreamStep& step : plan.record) {
-    result->record.push_back(
-        {step.isAnywhere, Ref<XQueryNameTest>(const_cast<XQueryNameTest*>(step.name))});
-  }
-  result->fold = plan.fold;
   result->description = plan.description();
-  result->first = plan.first;
-  result->last = plan.last;
-  result->each = Ref<XQueryExpr>(program[plan.each].expr);
-  const XQueryPlaceID body = XQueryPlaceInside(program, program.bodies().back().place);
-  result->call = Ref<XQueryFunctionCall>(dyn_cast<XQueryFunctionCall>(program[body].expr));
+  for (auto part = plan.parts.begin(); part != plan.parts.end(); ++part) {
+    result->parts.push_back(partOf(program, *part));
+    const auto isSame = [&](const XQueryStreamPart& other) { return other.record == part->record; };
+    if (std::any_of(plan.parts.begin(), part, isSame)) continue;
+    auto& path = result->records.emplace_back();
+    for (const XQueryStreamStep& step : part->record) {
+      path.push_back(
+          {step.isAnywhere, Ref<XQueryNameTest>(const_cast<XQueryNameTest*>(step.name))});
+    }
+  }
+  if (plan.around == XQueryNoPlace) return result;
+  result->firstVariable = firstFreeVariable(program);
+  int64_t variable = result->firstVariable;
+  for (const XQueryStreamPart& part : plan.parts) {
+    program.replace(part.place,
+                    make<FoldedExpr>(Ref<XQueryExpr>(program[part.place].expr), variable));
+    variable += 2;
+  }
+  result->around = program.install();
   return result;
+}
+
+// All at once, since what they have in common, declarations, is planned with them. What stands
+// around them is evaluated once, as it is written.
+void planParts(const XQueryProlog& prolog, XQueryStreamProgram& program) {
+  if (program.parts.size() == 1) {
+    Ref<XQueryExpr>& each = program.parts.front().each;
+    each = XQueryPlanned(prolog, each);
+    return;
+  }
+  const Ref<XQueryExprList> list = XQueryExprList::exprList();
+  for (const XQueryStreamProgram::Part& part : program.parts) list->addObject(part.each);
+  const Ref<XQueryExpr> planned = XQueryPlanned(prolog, list);
+  const auto* const parts = dyn_cast<XQueryExprList>(planned.get());
+  if (!parts || parts->count() != program.parts.size()) return;
+  for (size_t index = 0; index < parts->count(); ++index) {
+    program.parts[index].each = Ref<XQueryExpr>(parts->objectAtIndex(index));
+  }
 }
 
 }  // namespace
@@ -53,7 +130,7 @@ std::unique_ptr<const XQueryStreamProgram> XQueryStreamProgram::of(const XQueryP
     return result;
   }
   {
-    const XQueryProgram program(prolog, body);
+    XQueryProgram program(prolog, body);
     const XQueryStreamPlan plan = XQueryPlanStream(program, XQueryFactTable(program));
     if (!plan.isPossible()) {
       refusal = refusalOf(program, plan, prolog);
@@ -61,7 +138,7 @@ std::unique_ptr<const XQueryStreamProgram> XQueryStreamProgram::of(const XQueryP
     }
     result = programOf(program, plan);
   }
-  if (XQueryPlanIsEnabled()) result->each = XQueryPlanned(prolog, result->each);
+  if (XQueryPlanIsEnabled()) planParts(prolog, *result);
   return result;
 }
 

@@ -21,16 +21,24 @@ struct XQueryStreamProgram {
     bool isAnywhere;           // below, not a child
     Ref<XQueryNameTest> name;  // null for any element
   };
+  struct Part {
+    XQueryStreamFold fold = XQueryStreamFold::Items;
+    // Of a part of a sequence: the positions of its items.
+    uint64_t first = 1;
+    uint64_t last = 0;
+    bool isSure = true;  // XQueryStreamPart::isSure
+    // Evaluated with the document that holds the record as the context item. Planned.
+    Ref<XQueryExpr> each;
+    // Whose argument that is; null for a fold without a function.
+    Ref<XQueryFunctionCall> call;
+  };
 
-  std::vector<Step> record;
-  XQueryStreamFold fold = XQueryStreamFold::Items;
-  // Of a part: the positions of its items.
-  uint64_t first = 1;
-  uint64_t last = 0;
-  // Evaluated with the document that holds the record as the context item. Planned.
-  Ref<XQueryExpr> each;
-  // Whose argument that is; null for a fold without a function.
-  Ref<XQueryFunctionCall> call;
+  std::vector<std::vector<Step>> records;  // paths, none of them twice
+  std::vector<Part> parts;                 // one at least
+  // What is evaluated at the end, with two local variables for each of the parts, from this one on:
+  // for its value, and for its failure where it has one. Null where the only part is the whole.
+  Ref<XQueryExpr> around;
+  int64_t firstVariable = 0;
   std::string description;  // XQueryStreamPlan::description
 
   // Of a query that has been bound. Null, with the refusal, for one that cannot be evaluated so.

@@ -10,6 +10,11 @@
 //   - everything in it starts from that path, and nothing leaves the nodes that it finds or counts
 //     them among others.
 //
+// An expression around several such functions and quantifiers, as `sum(/a/b/c) div count(/a/b)`, is
+// evaluated once they are known, with their values in their places. It looks at nothing else of the
+// document. The records are then what any of the paths finds, outermost ones only: each path finds
+// below a record of another one what it finds there in the whole document.
+//
 // The record is what the longest beginning of the path finds that asks for names alone: predicates
 // look at what is below their step, and positions at what is beside it.
 //
@@ -36,6 +41,9 @@ class XQueryNameTest;
 struct XQueryStreamStep {
   bool isAnywhere;             // below, not a child
   const XQueryNameTest* name;  // null for any element
+
+  // Whether it finds the same.
+  bool operator==(const XQueryStreamStep& other) const;
 };
 
 // What is made of the values of the records.
@@ -54,23 +62,35 @@ enum class XQueryStreamFold : uint8_t {
   Part,  // the items of some positions
 };
 
-struct XQueryStreamPlan {
+// A path through the records, and what is made of what it finds.
+struct XQueryStreamPart {
   std::vector<XQueryStreamStep> record;
   XQueryStreamFold fold = XQueryStreamFold::Items;
-  // Of a part: the positions of its items.
+  // Of a part of a sequence: the positions of its items.
   uint64_t first = 1;
   uint64_t last = std::numeric_limits<uint64_t>::max();
+  // Whether it is asked for in any case: its failure is one of the whole.
+  bool isSure = true;
+  // Where its value stands.
+  XQueryPlaceID place = XQueryNoPlace;
   // What is evaluated for each record.
   XQueryPlaceID each = XQueryNoPlace;
+};
+
+struct XQueryStreamPlan {
+  std::vector<XQueryStreamPart> parts;
+  // What is evaluated at the end, around the values of the parts; no place where the only part is
+  // the whole.
+  XQueryPlaceID around = XQueryNoPlace;
 
   // Where and why the program cannot be evaluated so; no place where it can.
   XQueryPlaceID refusedAt = XQueryNoPlace;
   std::string_view reason;
 
   bool isPossible() const { return refusedAt == XQueryNoPlace; }
-  // As a path: "/site/people/person", "//item".
+  // As paths, with commas between: "/site/people/person", "/a/b, //item".
   std::string recordPath() const;
-  // For people: a line for the record, and one for the fold.
+  // For people: a line for the records, and one for the folds.
   std::string description() const;
 };
 

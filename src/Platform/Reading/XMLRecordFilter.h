@@ -16,7 +16,7 @@ namespace xquery {
 class XMLRecordFilter {
  public:
   // Of a tree that is a document without children yet.
-  XMLRecordFilter(ReadTree& tree, std::span<const XMLRecordStep> path);
+  XMLRecordFilter(ReadTree& tree, std::span<const XMLRecordPath> paths);
 
   // After a piece: how many elements were open before it, and are now. The record, if it is
   // complete by that; it must be dropped before the next piece.
@@ -33,7 +33,7 @@ class XMLRecordFilter {
 
  private:
   // Of the document and each open element outside of records: where to go back to, and how many
-  // steps of the path lead there, as bits.
+  // steps of each path lead there, as bits.
   struct Level {
     NSXMLTreeBuilder::Mark mark;
     uint64_t matched;
@@ -46,7 +46,10 @@ class XMLRecordFilter {
   size_t elementsAbove() const { return _levels.size() - 1; }
 
   ReadTree& _tree;
-  const std::span<const XMLRecordStep> _path;
+  // The steps of all paths, one behind the other. Each path has a place behind its last one, whose
+  // bit stands for a record.
+  std::vector<XMLRecordStep> _steps;
+  uint64_t _ends = 0;
   std::vector<Level, ValueAllocator<Level>> _levels;
   size_t _recordDepth = 0;  // of the record that is being read; 0 outside
   size_t _elementsKept = 0;

@@ -104,11 +104,10 @@ class LibXMLRecords final : public LibXMLHandler {
 
 class XMLRecords::Reading {
  public:
-  Reading(TextSource& source, std::span<const XMLRecordStep> path, uint32_t options)
-      : _path(path.begin(), path.end()),
-        _pieces(source, options, [this](std::string_view text) { leave(text); }),
+  Reading(TextSource& source, std::span<const XMLRecordPath> paths, uint32_t options)
+      : _pieces(source, options, [this](std::string_view text) { leave(text); }),
         _document(cast<NSXMLDocument>(_pieces.tree().current())),
-        _filter(_pieces.tree(), _path) {}
+        _filter(_pieces.tree(), paths) {}
   ~Reading() { _pieces.letGoOfTree(); }
   Reading(const Reading&) = delete;
   Reading& operator=(const Reading&) = delete;
@@ -127,7 +126,6 @@ class XMLRecords::Reading {
   void beginRoot();
   void dropUnfinishedTag();
 
-  const std::vector<XMLRecordStep> _path;
   ValueText<char> _prolog;  // what is before the document element
   TextLines _lines;
   bool _hasRoot = false;
@@ -228,8 +226,8 @@ bool XMLRecords::Reading::readRest(const Receiver& receive, NSXMLParseError& err
 
 // --- the door --------------------------------------------------------------------------------
 
-XMLRecords::XMLRecords(TextSource& source, std::span<const XMLRecordStep> path, uint32_t options)
-    : _reading(std::make_unique<Reading>(source, path, options)) {}
+XMLRecords::XMLRecords(TextSource& source, std::span<const XMLRecordPath> paths, uint32_t options)
+    : _reading(std::make_unique<Reading>(source, paths, options)) {}
 
 XMLRecords::~XMLRecords() = default;
 

@@ -21,19 +21,21 @@
 
 namespace xquery {
 
-// Which elements are records: those that a path of names finds from the document on, outermost
-// ones only.
+// Which elements are records: those that paths of names find from the document on, outermost ones
+// only.
 struct XMLRecordStep {
   bool isAnywhere = false;                  // below, not a child
   const NSXMLExpandedName* name = nullptr;  // null for any
 };
-constexpr size_t mostRecordSteps = 63;
+using XMLRecordPath = std::vector<XMLRecordStep>;
+// Of all paths together, each with one more than it has.
+constexpr size_t mostRecordSteps = 64;
 
 class XMLRecords {
  public:
   // `source` should not keep what it has read: one with a rewinding. The names live as long as this
   // does. `options` are NSXMLOptions.
-  XMLRecords(TextSource& source, std::span<const XMLRecordStep> path, uint32_t options);
+  XMLRecords(TextSource& source, std::span<const XMLRecordPath> paths, uint32_t options);
   ~XMLRecords();
   XMLRecords(const XMLRecords&) = delete;
   XMLRecords& operator=(const XMLRecords&) = delete;

@@ -151,7 +151,7 @@ TEST(CharacterSeams, NorDoesAProjection) {
 
 // The error comes with its place, as from libxml2 alone.
 TEST(CharacterSeams, NorAreTheyReadRecordByRecord) {
-  const XMLRecordStep path[] = {{}, {}};
+  const XMLRecordPath path[] = {{{}, {}}};
   forEachCut([&](const std::string& text) {
     NSXMLParseError expected;
     TextSource whole(text);

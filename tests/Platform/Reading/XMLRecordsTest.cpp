@@ -100,7 +100,7 @@ std::string shownError(const NSXMLParseError& error) {
 
 // With the error that ends the document, as all readers tell it.
 std::string actual(TextSource& source, const Path& path, uint32_t options) {
-  XMLRecords records(source, path.steps, options);
+  XMLRecords records(source, {&path.steps, 1}, options);
   std::string all;
   NSXMLParseError error;
   const auto receive = [&](const NSXMLElement& record) {
@@ -294,7 +294,7 @@ TEST(XMLRecords, EndWhenTheReceiverHasEnough) {
        {"<a><b/><b/><b/></a", "<!DOCTYPE a [<!ENTITY e ''>]><a><b/><b/>x"}) {
     TextSource source(text);
     const Path path("/a/b");
-    XMLRecords records(source, path.steps, 0);
+    XMLRecords records(source, {&path.steps, 1}, 0);
     NSXMLParseError error;
     int count = 0;
     EXPECT_TRUE(records.read([&](const NSXMLElement&) { return ++count < 2; }, error));
@@ -307,7 +307,7 @@ TEST(XMLRecords, PassOnWhatTheReceiverThrows) {
   for (const std::string text : {"<a><b/></a>", "<!DOCTYPE a [<!ENTITY e ''>]><a><b/></a>"}) {
     TextSource source(text);
     const Path path("/a/b");
-    XMLRecords records(source, path.steps, 0);
+    XMLRecords records(source, {&path.steps, 1}, 0);
     NSXMLParseError error;
     const auto receive = [](const NSXMLElement&) -> bool { throw std::length_error("its own"); };
     EXPECT_THROW(static_cast<void>(records.read(receive, error)), std::length_error);
@@ -338,7 +338,7 @@ TEST(XMLRecords, TakeNoMoreMemoryHoweverLongTheDocumentIs) {
   const readingtest::Ceiling watching(readingtest::MiB);
   TextSource source(manyRecords(size_t{6} << 20), [] { return false; });
   const Path path("/a/b");
-  XMLRecords records(source, path.steps, NSXMLNodePreserveWhitespace);
+  XMLRecords records(source, {&path.steps, 1}, NSXMLNodePreserveWhitespace);
   size_t count = 0;
   NSXMLParseError error;
   EXPECT_TRUE(records.read(
@@ -356,7 +356,7 @@ TEST(XMLRecords, ThatAreLargerThanTheCeilingEndInALimit) {
   while (text.size() < (size_t{8} << 20)) text += "<c>text</c>";
   TextSource source(text);
   const Path path("/a/b");
-  XMLRecords records(source, path.steps, 0);
+  XMLRecords records(source, {&path.steps, 1}, 0);
   NSXMLParseError error;
   int count = 0;
   const auto receive = [&](const NSXMLElement&) { return ++count > 0; };
