@@ -1,18 +1,20 @@
-// Evaluates all whole-query cases from several threads for as long as asked, in an order by chance:
-// compiled once or anew, planned or plain, against documents that the threads share and contexts
-// that are made, kept a while and dropped, with limits and cancellations that fire at random. Every
-// answer is the one that the case has alone, or that a limit was reached; and after the first part
-// of the time the process does not grow.
+// Evaluates all whole-query cases, and some queries that take longer, from several threads for as
+// long as asked, in an order by chance: compiled once or anew, planned or plain, against documents
+// that the threads share and contexts that are made, kept a while and dropped, with limits and
+// cancellations that fire at random. Every answer is the one that the case has alone, or that a
+// limit was reached; and after the first part of the time the process does not grow.
 //
 //   xquery_soak [--seconds N] [--threads N] [--seed N] [--growth MIB]
 //
-// The status is 1 when an answer differs, and when the process has grown by more than `growth` (32
-// MiB unless given) since the first fifth of the time, or since two minutes had passed.
+// The status is 1 when an answer differs, when not each kind of limit has ended an evaluation, and
+// when the process has grown by more than `growth` (32 MiB unless given) since the first fifth of
+// the time, or since two minutes had passed.
 #include "SoakCases.h"
 #include "xquery/Memory.h"
 #include "xquery/xquery.h"
 
 #include <algorithm>
+#include <array>
 #include <atomic>
 #include <chrono>
 #include <cstdio>
@@ -52,13 +54,22 @@ double residentMiB() {
   return resident * static_cast<double>(::sysconf(_SC_PAGESIZE)) / (1 << 20);
 }
 
+// What fires at random, and what the answer tells of it.
+struct Limit {
+  const char* name;
+  std::string_view text;
+};
+constexpr std::array limits = {Limit{"deadlines", " limit: deadline passed"},
+                               Limit{"cancellations", " limit: evaluation cancelled"},
+                               Limit{"memory ceilings", " limit: memory ceiling reached"}};
+
 // What the threads share.
 struct Run {
   const SoakCases& cases;
   Clock::time_point end;
   std::vector<std::shared_ptr<std::atomic<bool>>> flags;  // one for each thread, to be raised
   std::atomic<uint64_t> evaluations{0};
-  std::atomic<uint64_t> ended{0};  // at a limit
+  std::array<std::atomic<uint64_t>, limits.size()> ended{};  // at each of the limits
   std::atomic<uint64_t> differences{0};
   std::mutex printing{};
 
@@ -67,8 +78,8 @@ struct Run {
     constexpr uint64_t most = 20;
     if (++differences > most) return;
     const std::lock_guard lock(printing);
-    std::fprintf(stderr, "%s:%d\n  found\n%s  alone\n%s", c.file.c_str(), c.line, found.c_str(),
-                 c.alone.c_str());
+    std::fprintf(stderr, "%s:%d\n  found\n%s  alone\n%s", c.text.file.c_str(), c.text.line,
+                 found.c_str(), c.alone.c_str());
   }
 };
 
@@ -79,9 +90,9 @@ class Worker {
 
   void work() {
     while (!_run.isOver()) {
-      const SoakCase& c = _run.cases.all()[below(_run.cases.all().size())];
+      const SoakCase& c = anyCase();
       // A context remembers the context item and base URIs: another case would see them.
-      const auto context = xquery::XQueryContext::xqueryContextWithNamespaces(c.namespaces);
+      const auto context = xquery::XQueryContext::xqueryContextWithNamespaces(c.text.namespaces);
       for (size_t times = 1 + below(6); times > 0; --times) evaluate(c, *context);
     }
   }
@@ -91,45 +102,56 @@ class Worker {
     return std::uniform_int_distribution<size_t>(0, bound - 1)(_random);
   }
 
+  // One in some that takes long, so that limits have something to end.
+  const SoakCase& anyCase() {
+    const auto& all = _run.cases.all();
+    const size_t longCount = _run.cases.longCount();
+    return below(64) == 0 ? all[all.size() - 1 - below(longCount)] : all[below(all.size())];
+  }
+
   // Each of them seldom, and often none.
-  xquery::XQueryLimits limits() {
-    xquery::XQueryLimits limits;
+  xquery::XQueryLimits chosenLimits() {
+    xquery::XQueryLimits chosen;
     switch (below(8)) {
       case 0:
-        limits.duration = microseconds(below(2000));
+        chosen.duration = microseconds(below(2000));
         break;
       case 1:
-        limits.cancelled = _flag;
+        chosen.cancelled = _flag;
         break;
       case 2:
-        limits.memoryCeiling = below(1 << 20);
+        chosen.memoryCeiling = below(1 << 20);
         break;
       default:
         break;
     }
-    return limits;
+    return chosen;
   }
 
   xquery::Ref<xquery::XQuery> query(const SoakCase& c) {
     constexpr xquery::XQueryWay ways[] = {xquery::XQueryWay::Planned, xquery::XQueryWay::Plain,
                                           xquery::XQueryWay::Profiled};
-    if (below(16) == 0) return _run.cases.compiled(c, ways[below(3)]);
+    if (below(16) == 0) {
+      return xquery::querytest::compiledCase(c.text, c.folderURL, ways[below(3)]);
+    }
     return below(4) == 0 ? c.plain : c.planned;
   }
 
   void evaluate(const SoakCase& c, xquery::XQueryContext& context) {
     const auto compiled = query(c);
-    const xquery::XQueryLimits chosen = limits();
+    const xquery::XQueryLimits chosen = chosenLimits();
     context.contextSetLimits(chosen);
     const std::string found = soakAnswer(*compiled, context, c);
-    const bool isLimited = chosen.duration || chosen.cancelled || chosen.memoryCeiling;
     ++_run.evaluations;
     if (found == c.alone) return;
-    if (isLimited && isSoakLimit(found)) {
-      ++_run.ended;
-    } else {
-      _run.report(c, found);
+    const bool isChosen[] = {chosen.duration.has_value(), chosen.cancelled != nullptr,
+                             chosen.memoryCeiling.has_value()};
+    for (size_t i = 0; i < limits.size(); ++i) {
+      if (!isChosen[i] || !isSoakLimit(found, limits[i].text)) continue;
+      ++_run.ended[i];
+      return;
     }
+    _run.report(c, found);
   }
 
   Run& _run;
@@ -169,15 +191,22 @@ int soak(const Settings& settings) {
   std::this_thread::sleep_until(run.end - milliseconds(50));
   const double after = residentMiB();
   for (std::thread& thread : threads) thread.join();
-  std::printf("%llu evaluations of %zu cases, %llu of them ended at a limit, %llu different\n",
-              static_cast<unsigned long long>(run.evaluations), cases.all().size(),
-              static_cast<unsigned long long>(run.ended),
-              static_cast<unsigned long long>(run.differences));
+  const auto number = [](const std::atomic<uint64_t>& count) {
+    return static_cast<unsigned long long>(count);
+  };
+  std::printf("%llu evaluations of %zu cases, %llu different\n", number(run.evaluations),
+              cases.all().size(), number(run.differences));
+  bool haveAllFired = true;
+  for (size_t i = 0; i < limits.size(); ++i) {
+    std::printf("%s: %llu\n", limits[i].name, number(run.ended[i]));
+    haveAllFired = haveAllFired && run.ended[i] > 0;
+  }
+  if (!haveAllFired) std::printf("a limit that never fired shows nothing\n");
   std::printf("memory: %.1f MiB after %.0f s, %.1f MiB at the end\n", before,
               std::chrono::duration<double>(first).count(), after);
   const bool hasGrown = after - before > settings.growth;
   if (hasGrown) std::printf("grown by more than %.0f MiB\n", settings.growth);
-  return run.differences || hasGrown || run.evaluations == 0 ? EXIT_FAILURE : EXIT_SUCCESS;
+  return run.differences || hasGrown || !haveAllFired ? EXIT_FAILURE : EXIT_SUCCESS;
 }
 
 bool readArguments(int count, char** arguments, Settings& settings) {

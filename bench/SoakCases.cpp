@@ -1,114 +1,66 @@
 #include "SoakCases.h"
 
-#include <algorithm>
-#include <cstdio>
-#include <cstdlib>
 #include <fstream>
-#include <memory>
-#include <optional>
-#include <string_view>
-#include <tuple>
 #include <unistd.h>
 #include <utility>
 
 namespace bench {
 
 using namespace xquery;
+using querytest::QueryCase;
 
 namespace {
-
-constexpr std::string_view folderMark = "@folder@";
-
-std::string replaced(std::string text, std::string_view from, std::string_view by) {
-  for (size_t at = 0; (at = text.find(from, at)) != text.npos; at += by.size()) {
-    text.replace(at, from.size(), by);
-  }
-  return text;
-}
-
-std::pair<std::string, std::string> splitAt(const std::string& text, char separator) {
-  const size_t at = std::min(text.find(separator), text.size());
-  return {text.substr(0, at), text.substr(std::min(at + 1, text.size()))};
-}
-
-class Modules : public XQueryLoader {
- public:
-  explicit Modules(std::map<std::string, std::string> modules) : _modules(std::move(modules)) {}
-  std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose) override {
-    const auto found = _modules.find(URL.absoluteString()->utf8());
-    if (found == _modules.end()) return std::nullopt;
-    return XQueryResource{found->second, {}, {}, {}};
-  }
-
- private:
-  const std::map<std::string, std::string> _modules;
-};
 
 bool isRepeatable(const std::string& query) {
   return query.find("current-") == query.npos && query.find("real-date") == query.npos;
 }
 
-std::string printed(const NSObject& item) {
-  std::string text = XQueryItemTypeName(item) + "\t";
-  if (const auto* node = dyn_cast<NSXMLNode>(&item)) {
-    node->appendXMLTo(text);
-  } else {
-    text += XQueryItemStringValue(item);
-  }
-  return text;
-}
-
-// What a file says of a case.
-struct Sections {
-  SoakCase found;
-  std::string xml;
-  std::map<std::string, std::string> files;
-  std::string section;
-  std::string name;
-
-  void header(const std::string& line) {
-    std::tie(section, name) = splitAt(line, ' ');
-    const auto [key, value] = splitAt(name, '=');
-    if (section == "var") found.constants[key] = NSString::stringWithUTF8(value);
-    if (section == "namespace") found.namespaces[key] = value;
-  }
-  void content(const std::string& line) {
-    if (section == "xml") xml += line + "\n";
-    if (section == "file") files[name] += line + "\n";
-    if (section == "module") found.modules[name] += line + "\n";
-    if (section == "query") found.text += (found.text.empty() ? "" : "\n") + line;
-  }
+// The cases of the tests are over before most limits are looked at. Each of these takes some
+// milliseconds and a megabyte or more.
+constexpr const char* longQueries[] = {
+    "sum(for $i in 1 to 20000 return string-length(string($i)))",
+    "count(distinct-values(for $i in 1 to 20000 return concat('value ', $i)))",
+    "string-length(string-join(for $i in 1 to 20000 return 'some text', ' '))",
+    "count(<a>{for $i in 1 to 5000 return <b n='{$i}'>{$i, 'text'}</b>}</a>//b[@n > 2500])",
+    "(for $i in 1 to 20000 order by $i mod 101, $i descending return $i)[10000]",
+    "declare function local:f($n) { if ($n = 0) then () else (string($n), local:f($n - 1)) };"
+    "count(local:f(300)) + sum(for $i in 1 to 10 return count(local:f(200)))",
 };
 
 }  // namespace
 
 std::string soakAnswer(const XQuery& query, XQueryContext& context, const SoakCase& c) {
   Ref<XQueryError> error;
-  const auto items = context.evaluateXQuery(query, c.constants, c.document, &error);
+  const auto items = context.evaluateXQuery(query, c.text.constants, c.document, &error);
   if (error) {
     return "error " + std::to_string(error->err()) + " line " + std::to_string(error->line()) +
            " " + (error->msg() ? error->msg()->utf8() : "") + "\n";
   }
   std::string text;
   for (size_t i = 0; items && i < items->count(); ++i) {
-    text += printed(*items->objectAtIndex(i)) + "\n";
+    text += querytest::printedItem(*items->objectAtIndex(i)) + "\n";
   }
   return text;
 }
 
-bool isSoakLimit(const std::string& answer) {
-  return answer.starts_with("error 0 ") && answer.find(" limit: ") != answer.npos;
+bool isSoakLimit(const std::string& answer, std::string_view text) {
+  return answer.starts_with("error 0 ") && answer.find(text) != answer.npos;
 }
 
 SoakCases::SoakCases()
     : _folder(std::filesystem::temp_directory_path() /
               ("xquery-soak-" + std::to_string(::getpid()))) {
-  std::vector<std::filesystem::path> files;
-  for (const auto& entry : std::filesystem::directory_iterator(XQUERY_QUERY_CASES)) {
-    if (entry.path().extension() == ".cases") files.push_back(entry.path());
+  for (const auto& place : querytest::placesOfCases(XQUERY_QUERY_CASES)) {
+    const QueryCase text = querytest::readCase(place);
+    if (isRepeatable(text.query)) add(text);
   }
-  std::sort(files.begin(), files.end());
-  for (const auto& file : files) readFile(file);
+  for (const char* const query : longQueries) {
+    QueryCase text;
+    text.file = query;
+    text.query = query;
+    add(text);
+    ++_longCount;
+  }
 }
 
 SoakCases::~SoakCases() {
@@ -116,56 +68,27 @@ SoakCases::~SoakCases() {
   std::filesystem::remove_all(_folder, ignored);
 }
 
-void SoakCases::readFile(const std::filesystem::path& path) {
-  std::ifstream in(path);
-  Sections sections;
-  const auto take = [&] {
-    if (!sections.found.text.empty()) finish(sections.found, sections.xml, sections.files);
-  };
-  std::string line;
-  for (int number = 1; std::getline(in, line); ++number) {
-    if (line.starts_with("== ")) {
-      take();
-      sections = {};
-      sections.found.file = path.filename().string();
-      sections.found.line = number;
-    } else if (line.starts_with("-- ")) {
-      sections.header(line.substr(3));
-    } else {
-      sections.content(line);
-    }
-  }
-  take();
-}
-
-void SoakCases::finish(SoakCase& c, const std::string& xml,
-                       const std::map<std::string, std::string>& files) {
-  if (!isRepeatable(c.text)) return;
+void SoakCases::add(const QueryCase& text) {
   const std::filesystem::path folder = _folder / std::to_string(_all.size());
-  for (const auto& [name, text] : files) {
+  for (const auto& [name, content] : text.files) {
     std::filesystem::create_directories((folder / name).parent_path());
-    std::ofstream(folder / name, std::ios::binary) << text;
+    std::ofstream(folder / name, std::ios::binary) << content;
   }
-  c.text = replaced(c.text, folderMark, "file://" + folder.string() + "/");
-  if (!xml.empty()) {
-    Value& document = _documents[xml];
-    if (!document) document = NSXMLDocument::documentWithData(xml, NSXMLNodePreserveWhitespace);
+  SoakCase c;
+  c.text = text;
+  c.folderURL = "file://" + folder.string() + "/";
+  if (!text.xml.empty()) {
+    Value& document = _documents[text.xml];
+    if (!document) {
+      document = NSXMLDocument::documentWithData(text.xml, NSXMLNodePreserveWhitespace);
+    }
     c.document = document;
   }
-  c.plain = compiled(c, XQueryWay::Plain);
-  c.planned = compiled(c, XQueryWay::Planned);
-  const auto context = XQueryContext::xqueryContextWithNamespaces(c.namespaces);
+  c.plain = querytest::compiledCase(text, c.folderURL, XQueryWay::Plain);
+  c.planned = querytest::compiledCase(text, c.folderURL, XQueryWay::Planned);
+  const auto context = XQueryContext::xqueryContextWithNamespaces(text.namespaces);
   c.alone = soakAnswer(*c.plain, *context, c);
   _all.push_back(std::move(c));
-}
-
-Ref<XQuery> SoakCases::compiled(const SoakCase& c, XQueryWay way) const {
-  XQueryLoading loading;
-  if (!c.modules.empty()) loading.loader = std::make_shared<Modules>(c.modules);
-  for (const auto& [URL, text] : c.modules) {
-    loading.policy.allowScheme(URL.substr(0, URL.find(':')));
-  }
-  return XQuery::xqueryWithSource(c.text, loading, XQueryLimits(), way);
 }
 
 }  // namespace bench

@@ -1,22 +1,21 @@
-// The whole-query cases of tests/queries, compiled and with the answer that each has alone.
+// The whole-query cases of tests/queries and some queries that take longer, compiled and with the
+// answer that each has alone.
 #pragma once
 
+#include "queries/QueryCase.h"
 #include "xquery/xquery.h"
 
 #include <filesystem>
 #include <map>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace bench {
 
 struct SoakCase {
-  std::string file;  // and line, of its name
-  int line = 0;
-  std::string text;
-  xquery::XQueryVariables constants;
-  std::map<std::string, std::string> namespaces;
-  std::map<std::string, std::string> modules;
+  xquery::querytest::QueryCase text;
+  std::string folderURL;   // of its files
   xquery::Value document;  // null for none; shared by all cases with the same text
   xquery::Ref<xquery::XQuery> plain;
   xquery::Ref<xquery::XQuery> planned;
@@ -31,22 +30,24 @@ class SoakCases {
   SoakCases(const SoakCases&) = delete;
   SoakCases& operator=(const SoakCases&) = delete;
 
-  // Without those that answer anew each time, as what asks for the time does.
+  // Without those that answer anew each time, as what asks for the time does. The last few take
+  // longer than all others.
   const std::vector<SoakCase>& all() const { return _all; }
-  xquery::Ref<xquery::XQuery> compiled(const SoakCase& c, xquery::XQueryWay way) const;
+  size_t longCount() const { return _longCount; }
 
  private:
-  void readFile(const std::filesystem::path& path);
-  void finish(SoakCase& c, const std::string& xml, const std::map<std::string, std::string>& files);
+  void add(const xquery::querytest::QueryCase& text);
 
   std::filesystem::path _folder;
   std::map<std::string, xquery::Value> _documents;
   std::vector<SoakCase> _all;
+  size_t _longCount = 0;
 };
 
 // The items with their types, a line for each, or the error with its number, line and text.
 std::string soakAnswer(const xquery::XQuery& query, xquery::XQueryContext& context,
                        const SoakCase& c);
-bool isSoakLimit(const std::string& answer);
+// Whether that is an error of a limit with that text.
+bool isSoakLimit(const std::string& answer, std::string_view text);
 
 }  // namespace bench

@@ -2,6 +2,7 @@
 // there is nothing to say.
 #include "Check/Check.h"
 #include "CheckTesting.h"
+#include "Engine/ModuleTable.h"
 #include "Platform/Base/SanitizedSizes.h"
 
 #include <gmock/gmock.h>
@@ -10,8 +11,6 @@
 #include <filesystem>
 #include <fstream>
 #include <map>
-#include <memory>
-#include <optional>
 #include <sstream>
 #include <string>
 
@@ -52,24 +51,10 @@ TEST(Check, ChangesNothing) {
 
 // --- modules -------------------------------------------------------------------------------------
 
-class Modules : public XQueryLoader {
- public:
-  std::map<std::string, std::string> texts;
-
-  std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose) override {
-    const auto found = texts.find(URL.absoluteString()->utf8());
-    if (found == texts.end()) return std::nullopt;
-    return XQueryResource{found->second, {}, {}, {}};
-  }
-};
-
 std::vector<XQueryWarning> warningsWithModules(std::string_view main,
-                                               std::map<std::string, std::string> texts) {
-  XQueryLoading loading;
+                                               const ModuleTable::Texts& texts) {
+  XQueryLoading loading = loadingOf(texts);
   loading.moduleURL = "http://m/main";
-  const auto modules = std::make_shared<Modules>();
-  modules->texts = std::move(texts);
-  loading.loader = modules;
   const auto query = XQuery::xqueryWithSource(main, loading, XQueryLimits(), XQueryWay::Explained);
   EXPECT_FALSE(query->parseErrors());
   return XQueryWarnings(*query);

@@ -1,13 +1,13 @@
 // Several threads at once: one query over one document, each thread with a context of its own;
 // compilations; first uses; values handed from thread to thread.
 #include "Engine/ConcurrencyTesting.h"
+#include "Engine/ModuleTable.h"
 #include "Platform/Loading/LoadingTestSupport.h"
 
 #include <gtest/gtest.h>
 
 #include <barrier>
 #include <deque>
-#include <map>
 #include <mutex>
 #include <string>
 #include <thread>
@@ -393,30 +393,14 @@ TEST(ConcurrencyOfFirstUses, EverythingBeginsAtOnce) {
 
 // --- compiling -----------------------------------------------------------------------------------
 
-// Library modules of a host, given out to any number of threads.
-class Modules : public XQueryLoader {
- public:
-  explicit Modules(std::map<std::string, std::string> modules) : _modules(std::move(modules)) {}
-  std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose) override {
-    const auto found = _modules.find(URL.absoluteString()->utf8());
-    if (found == _modules.end()) return std::nullopt;
-    return XQueryResource{found->second, {}, {}, {}};
-  }
-
- private:
-  const std::map<std::string, std::string> _modules;
-};
-
 XQueryLoading modules() {
-  XQueryLoading loading;
-  loading.loader = std::make_shared<Modules>(std::map<std::string, std::string>{
+  return loadingOf({
       {"http://host/a",
        "module namespace a = 'urn:a'; import module namespace b = 'urn:b' at 'http://host/b'; "
        "declare variable $a:v := $b:v + 1; declare function a:f($x) { $x * $a:v };"},
       {"http://host/b", "module namespace b = 'urn:b'; declare variable $b:v := 20;"},
       {"http://host/bad", "module namespace bad = 'urn:bad'; declare function bad:f() { 1 + };"},
   });
-  return loading;
 }
 
 TEST(Concurrency, CompilationsAreSerialised) {
