@@ -11,18 +11,12 @@
 
 #include <algorithm>
 #include <chrono>
-#include <cstdlib>
 #include <functional>
 
 namespace xquery {
 namespace {
 
 using namespace plantest;
-
-unsigned numberFrom(const char* variable, unsigned otherwise) {
-  const char* value = std::getenv(variable);
-  return value ? static_cast<unsigned>(std::strtoul(value, nullptr, 10)) : otherwise;
-}
 
 unsigned programCount() {
   return numberFrom("XQUERY_PLAN_PROGRAMS", 200);
@@ -31,20 +25,8 @@ unsigned programCount() {
 // Programs of which fewer come to a value, or are planned, show nothing.
 constexpr unsigned fewestPart = 5;
 
-// Some programs go on for hours. What ends at its limit is compared with nothing.
-XQueryLimits limits(std::chrono::seconds duration) {
-  XQueryLimits found;
-  found.duration = duration;
-  found.memoryCeiling = uint64_t{256} << 20;
-  return found;
-}
 constexpr std::chrono::seconds plainDuration(1);
 constexpr std::chrono::seconds plannedDuration(60);
-
-bool endedAtLimit(const Outcome& outcome) {
-  return !outcome.lines.empty() && outcome.lines.front().starts_with("error 0 ") &&
-         outcome.lines.front().find("limit: ") != std::string::npos;
-}
 
 // How many programs there were.
 unsigned forEachProgram(const std::function<void(const std::string&, const Value&)>& visit) {
@@ -171,7 +153,7 @@ TEST(GeneratedPrograms, ContradictNoFact) {
     const auto checked =
         make<XQuery>(std::make_unique<XQueryInternal>(Ref<XQueryProlog>(internal.prolog()), body));
     const auto context = XQueryContext::xqueryContext();
-    context->contextSetLimits(limits(plainDuration));
+    context->contextSetLimits(boundedBy(plainDuration));
     Ref<XQueryError> error;
     const auto items = context->evaluateXQuery(*checked, {}, contextItem, &error);
     values += items ? 1 : 0;
@@ -187,11 +169,11 @@ TEST(GeneratedPrograms, AnswerTheSamePlannedAndPlain) {
   const unsigned programs = forEachProgram([&](const std::string& text, const Value& contextItem) {
     const auto planned = compiled(text, XQueryWay::Planned);
     operators += OperatorList(*_internal(*planned).body()).operators.size();
-    const Outcome plain = outcomeOf(*compiled(text), contextItem, {}, limits(plainDuration));
+    const Outcome plain = outcomeOf(*compiled(text), contextItem, {}, boundedBy(plainDuration));
     if (endedAtLimit(plain)) return;
-    EXPECT_EQ(plain.lines, outcomeOf(*planned, contextItem, {}, limits(plannedDuration)).lines);
+    EXPECT_EQ(plain.lines, outcomeOf(*planned, contextItem, {}, boundedBy(plannedDuration)).lines);
     const auto profiled = compiled(text, XQueryWay::Profiled);
-    EXPECT_EQ(plain.lines, outcomeOf(*profiled, contextItem, {}, limits(plannedDuration)).lines);
+    EXPECT_EQ(plain.lines, outcomeOf(*profiled, contextItem, {}, boundedBy(plannedDuration)).lines);
     values += plain.lines.empty() || plain.lines.front().starts_with("error") ? 0 : 1;
   });
   EXPECT_GT(operators, programs / fewestPart);

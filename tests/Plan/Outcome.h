@@ -5,6 +5,9 @@
 #include "Engine/ErrorPlaceText.h"
 #include "xquery/xquery.h"
 
+#include <algorithm>
+#include <chrono>
+#include <cstdint>
 #include <string>
 #include <unordered_map>
 #include <utility>
@@ -29,24 +32,26 @@ inline std::string shownItem(const NSObject& item) {
   return text;
 }
 
+// Of what fails.
+inline Outcome outcomeOf(const XQueryError& error) {
+  const std::string message = error.msg() ? error.msg()->utf8() : "";
+  return {{"error " + std::to_string(error.err()) + " line " + std::to_string(error.line()) + " " +
+               message,
+           placeText(error)}};
+}
+
 inline Outcome outcomeIn(XQueryContext& context, const XQuery& query, const Value& contextItem,
                          const XQueryVariables& constants = {}) {
   Outcome outcome;
   Ref<XQueryError> error;
   const auto items = context.evaluateXQuery(query, constants, contextItem, &error);
-  if (error) {
-    outcome.lines.push_back("error " + std::to_string(error->err()) + " line " +
-                            std::to_string(error->line()) + " " +
-                            (error->msg() ? error->msg()->utf8() : ""));
-    outcome.lines.push_back(placeText(*error));
-  }
+  if (error) outcome = outcomeOf(*error);
   if (items) {
     std::unordered_map<const NSObject*, size_t> places;
     for (const Value& item : items->objects()) {
       const auto [first, isNew] = places.try_emplace(item.get(), outcome.lines.size());
-      std::string line = shownItem(*item);
-      if (!isNew) line += " as " + std::to_string(first->second);
-      outcome.lines.push_back(std::move(line));
+      outcome.lines.push_back(shownItem(*item));
+      if (!isNew) outcome.lines.push_back("same as " + std::to_string(first->second));
     }
   }
   const auto& left = _internal(context);
@@ -54,6 +59,34 @@ inline Outcome outcomeIn(XQueryContext& context, const XQuery& query, const Valu
     outcome.lines.push_back("left " + shownItem(*left.contextItem()) + " at " +
                             std::to_string(left.position()) + " of " + std::to_string(left.last()));
   }
+  return outcome;
+}
+
+// Some programs go on for hours. What ends at its limit is compared with nothing.
+inline XQueryLimits boundedBy(std::chrono::milliseconds duration,
+                              uint64_t memoryCeiling = uint64_t{256} << 20) {
+  XQueryLimits limits;
+  limits.duration = duration;
+  limits.memoryCeiling = memoryCeiling;
+  return limits;
+}
+
+inline bool endedAtLimit(const Outcome& outcome) {
+  return std::any_of(outcome.lines.begin(), outcome.lines.end(), [](const std::string& line) {
+    return line.starts_with("error 0 ") && line.find("limit: ") != line.npos;
+  });
+}
+
+// Without the focus that is left, whose document may be less than whole.
+inline Outcome withoutFocus(Outcome outcome) {
+  std::erase_if(outcome.lines, [](const std::string& line) { return line.starts_with("left "); });
+  return outcome;
+}
+
+// Nor which items are the same object.
+inline Outcome withoutIdentity(Outcome outcome) {
+  std::erase_if(outcome.lines,
+                [](const std::string& line) { return line.starts_with("same as "); });
   return outcome;
 }
 

@@ -13,6 +13,7 @@
 #include <gtest/gtest.h>
 
 #include <array>
+#include <cstdlib>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -26,6 +27,12 @@ inline Ref<XQuery> compiled(std::string_view text, XQueryWay way = XQueryWay::Pl
   EXPECT_FALSE(errors) << text << "\n  "
                        << cast<XQueryError>(errors->objects().front())->description()->utf8();
   return query;
+}
+
+// How many there are to be, or with which to begin: what the environment says.
+inline unsigned numberFrom(const char* variable, unsigned otherwise) {
+  const char* value = std::getenv(variable);
+  return value ? static_cast<unsigned>(std::strtoul(value, nullptr, 10)) : otherwise;
 }
 
 inline XQueryProgram programOf(const XQuery& query) {

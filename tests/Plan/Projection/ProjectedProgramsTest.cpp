@@ -5,24 +5,11 @@
 #include "Platform/Reading/XMLDocuments.h"
 
 #include <chrono>
-#include <cstdlib>
 
 namespace xquery {
 namespace {
 
 using namespace plantest;
-
-unsigned numberFrom(const char* variable, unsigned otherwise) {
-  const char* value = std::getenv(variable);
-  return value ? static_cast<unsigned>(std::strtoul(value, nullptr, 10)) : otherwise;
-}
-
-XQueryLimits limits(std::chrono::seconds duration) {
-  XQueryLimits found;
-  found.duration = duration;
-  found.memoryCeiling = uint64_t{256} << 20;
-  return found;
-}
 
 Value projected(const XQuery& query, std::string_view xml, uint32_t options, XMLWay way) {
   const auto* plan = _internal(query).projectionPlan();
@@ -34,16 +21,6 @@ Value projected(const XQuery& query, std::string_view xml, uint32_t options, XML
   return document;
 }
 
-// The document that is left as the context item is not the same.
-Outcome withoutFocus(Outcome outcome) {
-  std::erase_if(outcome.lines, [](const std::string& line) { return line.starts_with("left "); });
-  return outcome;
-}
-
-bool endedAtLimit(const Outcome& outcome) {
-  return !outcome.lines.empty() && outcome.lines.front().find("limit: ") != std::string::npos;
-}
-
 // Whether the program needs less than all.
 bool agrees(const std::string& text, const std::string& xml, uint32_t options) {
   const auto query = compiled(text, XQueryWay::Planned);
@@ -53,12 +30,12 @@ bool agrees(const std::string& text, const std::string& xml, uint32_t options) {
   NSXMLParseError failure;
   const Value whole = readDocument(source, options, failure);
   const Outcome expected =
-      withoutFocus(outcomeOf(*compiled(text), whole, {}, limits(std::chrono::seconds(1))));
+      withoutFocus(outcomeOf(*compiled(text), whole, {}, boundedBy(std::chrono::seconds(1))));
   if (endedAtLimit(expected)) return false;
   for (const XMLWay way : {XMLWay::Either, XMLWay::LibXML}) {
     const Value part = projected(*query, xml, options, way);
     EXPECT_EQ(expected.lines,
-              withoutFocus(outcomeOf(*query, part, {}, limits(std::chrono::seconds(60)))).lines)
+              withoutFocus(outcomeOf(*query, part, {}, boundedBy(std::chrono::seconds(60)))).lines)
         << text << "\n"
         << xml << "\n"
         << plan->projection.description();
