@@ -5,6 +5,7 @@
 #include <curl/curl.h>
 
 #include <algorithm>
+#include <limits>
 #include <memory>
 #include <mutex>
 #include <new>
@@ -113,6 +114,10 @@ void Transfer::configure() {
   curl_easy_setopt(easy, CURLOPT_FOLLOWLOCATION, 0L);
   curl_easy_setopt(easy, CURLOPT_CONNECTTIMEOUT_MS, milliseconds(_request.connectTimeout));
   curl_easy_setopt(easy, CURLOPT_TIMEOUT_MS, milliseconds(_request.totalTimeout));
+  // A body that is said to be longer is not waited for. Zero would mean no limit.
+  curl_easy_setopt(easy, CURLOPT_MAXFILESIZE_LARGE,
+                   static_cast<curl_off_t>(std::clamp<uint64_t>(
+                       _request.mostBytes, 1, std::numeric_limits<int64_t>::max())));
   // A name that is still being looked up is not waited for when the transfer is given up.
   curl_easy_setopt(easy, CURLOPT_QUICK_EXIT, 1L);
   // Signals are the host's.
@@ -151,7 +156,9 @@ CURLcode Transfer::outcome() {
 
 std::string Transfer::reason(CURLcode code) const {
   // A line of a header that is longer than it takes is out of memory to libcurl.
-  if (_isTooLong || code == CURLE_OUT_OF_MEMORY) return "more bytes than allowed";
+  if (_isTooLong || code == CURLE_OUT_OF_MEMORY || code == CURLE_FILESIZE_EXCEEDED) {
+    return "more bytes than allowed";
+  }
   if (_isForbidden) return "its address is not allowed";
   return _message[0] ? _message : curl_easy_strerror(code);
 }

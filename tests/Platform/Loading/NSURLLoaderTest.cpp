@@ -3,11 +3,13 @@
 #include "Platform/Loading/LoadingTestSupport.h"
 #include "Platform/Loading/NSURLLoader.h"
 
+#include <atomic>
 #include <chrono>
 #include <fcntl.h>
 #include <map>
 #include <sys/inotify.h>
 #include <sys/stat.h>
+#include <thread>
 #include <vector>
 
 namespace xquery {
@@ -99,6 +101,27 @@ TEST(LocalFile, LongerThanAllowedIsNothing) {
   EXPECT_EQ(loaded(loading, folder.write("5", "12345")), "(nothing: more bytes than allowed)");
   // Files of the system tell no size.
   EXPECT_EQ(loaded(loading, "file:///proc/self/status"), "(nothing: more bytes than allowed)");
+}
+
+// What is loaded is what was there at one moment or another, and never more than allowed.
+TEST(LocalFile, MayShrinkAndGrowWhileItIsRead) {
+  constexpr size_t small = 10, allowed = 1'000'000, large = allowed + 1;
+  TestFolder folder;
+  const std::string URL = folder.write("a.xml", std::string(large, 'x'));
+  XQueryLoading loading;
+  loading.limits.mostBytes = allowed;
+  std::atomic<bool> isOver = false;
+  std::thread changing([&] {
+    for (size_t i = 0; !isOver; ++i) {
+      std::filesystem::resize_file(folder.path("a.xml"), i % 2 ? small : large);
+    }
+  });
+  for (int i = 0; i < 100; ++i) {
+    const std::string text = loaded(loading, URL);
+    EXPECT_TRUE(text == "(nothing: more bytes than allowed)" || text.size() <= allowed);
+  }
+  isOver = true;
+  changing.join();
 }
 
 TEST(LocalFile, PolicyJudgesTheFileThatIsOpened) {
@@ -390,6 +413,51 @@ TEST_F(Server, ABodyThatBreaksOffIsNothing) {
     connection.send("HTTP/1.1 200 Fine\r\nContent-Length: 100\r\nConnection: close\r\n\r\n<a/>");
   });
   EXPECT_NE(failure("/a"), "none");
+}
+
+// What a server says of the length of a body, and what there is then; empty for nothing.
+struct SaidLength {
+  const char* header;
+  const char* body;
+  const char* loaded;
+};
+
+TEST_F(Server, WrongLengthsLoadNothingAndNoMoreThanTheySay) {
+  const SaidLength lengths[] = {
+      {"Content-Length: 4\r\n", "<a/>", "<a/>"},
+      {"Content-Length: 2\r\n", "<a/>", "<a"},
+      {"Content-Length: 0\r\n", "<a/>", ""},
+      {"Content-Length: 5\r\n", "<a/>", nullptr},
+      {"Content-Length: 1000000000000000000\r\n", "<a/>", nullptr},
+      {"Content-Length: -1\r\n", "<a/>", nullptr},
+      {"Content-Length: four\r\n", "<a/>", nullptr},
+      {"Transfer-Encoding: chunked\r\n", "4\r\n<a/>\r\n0\r\n\r\n", "<a/>"},
+      {"Transfer-Encoding: chunked\r\n", "4\r\n<a/>\r\n", nullptr},
+      {"Transfer-Encoding: chunked\r\n", "5\r\n<a/>", nullptr},
+      {"Transfer-Encoding: chunked\r\n", "four\r\n<a/>\r\n0\r\n\r\n", nullptr},
+      {"Transfer-Encoding: chunked\r\n", "ffffffffffffffffff\r\n<a/>\r\n0\r\n\r\n", nullptr},
+      {"Transfer-Encoding: chunked\r\n", "-1\r\n<a/>\r\n0\r\n\r\n", nullptr},
+  };
+  for (const SaidLength& each : lengths) {
+    server.handle("/a", [&](HTTPServer::Connection& connection) {
+      connection.send(std::string("HTTP/1.1 200 Fine\r\n") + each.header +
+                      "Connection: close\r\n\r\n" + each.body);
+    });
+    const auto resource = load("/a");
+    EXPECT_EQ(resource.has_value(), each.loaded != nullptr) << each.header << each.body;
+    if (resource && each.loaded) {
+      EXPECT_EQ(resource->data, each.loaded) << each.header;
+    }
+  }
+}
+
+TEST_F(Server, ALengthBeyondWhatIsAllowedIsNotWaitedFor) {
+  loading.limits.mostBytes = 1000;
+  server.handle("/a", [](HTTPServer::Connection& connection) {
+    connection.send("HTTP/1.1 200 Fine\r\nContent-Length: 1001\r\nConnection: close\r\n\r\n");
+    connection.waitForEnd();
+  });
+  EXPECT_EQ(failure("/a"), "more bytes than allowed");
 }
 
 TEST_F(Server, WhatIsNotHttpIsNothing) {
