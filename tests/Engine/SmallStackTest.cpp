@@ -2,6 +2,7 @@
 #include "Engine/LimitsTestSupport.h"
 #include "Platform/Base/StackTestSupport.h"
 
+#include <algorithm>
 #include <filesystem>
 #include <fstream>
 #include <unistd.h>
@@ -111,6 +112,36 @@ TEST(SmallStack, ADocumentFromAFileIsReadOrAnError) {
         << size;
   }
   std::filesystem::remove(path);
+}
+
+TEST(SmallStack, AStreamIsReadOrAnError) {
+  constexpr size_t depth = 1000;
+  const std::string documents[] = {
+      "<a>" + repeated("<b>1</b>", 1000) + "</a>",
+      "<a><b>" + repeated("<c>", depth) + repeated("</c>", depth) + "</b></a>",
+      "<!DOCTYPE a [<!ENTITY e 'x'>]><a><b>&e;</b></a>",
+  };
+  const auto query = XQuery::xqueryWithSource("for $b in /a/b return string($b)", XQueryLoading(),
+                                              XQueryLimits(), XQueryWay::Streamed);
+  for (const size_t size : sizes) {
+    for (const std::string& document : documents) {
+      onStack(size, [&] {
+        XQueryStreamInput input;
+        input.read = [left = std::string_view(document)](char* buffer, size_t most) mutable {
+          const size_t count = left.copy(buffer, std::min(most, size_t{100}));
+          left.remove_prefix(count);
+          return static_cast<ptrdiff_t>(count);
+        };
+        XQueryStreamFailure failure;
+        size_t items = 0;
+        const auto receive = [&](const Value&) { return ++items > 0; };
+        const bool isComplete =
+            XQueryContext::xqueryContext()->evaluateStream(*query, {}, input, receive, failure);
+        EXPECT_TRUE(isComplete ? items > 0 : failure.error || !failure.reading.message.empty())
+            << size << " " << document.substr(0, 20);
+      });
+    }
+  }
 }
 
 TEST(SmallStack, APatternOfManyGroupsIsCompiledOrAnError) {
