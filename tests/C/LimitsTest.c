@@ -1,6 +1,7 @@
 /* Time, memory and cancellation, of evaluations and compilations. */
 #define _POSIX_C_SOURCE 200809L
 
+#include "JumpingClock.h"
 #include "Testing.h"
 
 #include <pthread.h>
@@ -255,6 +256,42 @@ static void a_limit_ends_what_callbacks_do(void) {
   check_limit_within_callback(read_endlessly);
 }
 
+/* A day, or a lifetime, in either direction whenever somebody looks. Time that passes is not what
+ * the clock of the day shows. */
+static void a_clock_that_jumps_is_no_limit(void) {
+  static const long long steps[] = {86400, -86400, 2000000000, -2000000000};
+  xq_query* query = compiled(
+      "count(for $i in 1 to 1000 return string(current-dateTime())),"
+      "count(distinct-values(for $i in 1 to 10 return string(current-dateTime()))),"
+      "exists(current-date() + xdt:dayTimeDuration('P1D'))");
+  size_t i;
+  for (i = 0; i < sizeof(steps) / sizeof(steps[0]); i++) {
+    xq_options* options = NULL;
+    xq_context* context = NULL;
+    xq_value* items = NULL;
+    double start;
+    CHECK_OK(xq_options_new(&options));
+    CHECK_OK(xq_options_set_timeout(options, 3600000000000));
+    CHECK_OK(xq_context_new(&context));
+    CHECK_OK(xq_context_set_options(context, options));
+    jump_by(steps[i]);
+    CHECK_OK(xq_evaluate(context, query, &items, NULL));
+    check_items(items, "1000 1 true");
+    CHECK_OK(xq_options_set_timeout(options, 20000000));
+    start = now();
+    check_limit(options, endless, "limit: deadline passed");
+    CHECK(now() - start < 30);
+#ifndef XQUERY_SANITIZED
+    CHECK(looks_at_clock() > 0);
+#endif
+    stop_jumping();
+    CHECK_OK(xq_value_free(items));
+    CHECK_OK(xq_context_free(context));
+    CHECK_OK(xq_options_free(options));
+  }
+  CHECK_OK(xq_query_free(query));
+}
+
 static void ways_and_limits_that_there_are_not_are_wrong_use(void) {
   xq_options* options = NULL;
   CHECK_OK(xq_options_new(&options));
@@ -276,6 +313,7 @@ const test_case limits_tests[] = {
     {"a signal handler cancels an evaluation", a_signal_handler_cancels_an_evaluation},
     {"a flag outlives its handle", a_flag_outlives_its_handle},
     {"a limit ends what callbacks do", a_limit_ends_what_callbacks_do},
+    {"a clock that jumps is no limit", a_clock_that_jumps_is_no_limit},
     {"ways and limits that there are not", ways_and_limits_that_there_are_not_are_wrong_use},
     TEST_END,
 };
