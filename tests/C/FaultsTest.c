@@ -188,6 +188,124 @@ static xq_status making_values(void) {
   return status == XQ_END ? XQ_OK : status;
 }
 
+static ptrdiff_t read_text(void* data, char* buffer, size_t size) {
+  const char** rest = (const char**)data;
+  size_t count = strlen(*rest);
+  if (count > size) count = size;
+  if (count > 7) count = 7;
+  memcpy(buffer, *rest, count);
+  *rest += count;
+  return (ptrdiff_t)count;
+}
+
+static xq_status receive_text(void* data, const xq_value* item) {
+  return xq_value_xml(item, 0, (xq_text*)data);
+}
+
+static xq_status stream(void) {
+  const char* rest = books;
+  xq_options* options = NULL;
+  xq_query* query = NULL;
+  xq_context* context = NULL;
+  xq_error* error = NULL;
+  xq_text text = XQ_TEXT_INIT;
+  xq_status status = xq_options_new(&options);
+  if (!status) status = xq_options_set_way(options, XQ_WAY_STREAMED);
+  if (!status) {
+    status = xq_compile("for $b in /books/book where $b/price > 5 return <t>{$b/title}</t>", XQ_NUL,
+                        options, &query, &error);
+  }
+  if (!status) status = xq_context_new(&context);
+  if (!status) {
+    status =
+        xq_stream_input(context, query, read_text, &rest, XQ_READ_XML, receive_text, &text, &error);
+  }
+  xq_error_free(error);
+  xq_text_free(&text);
+  xq_context_free(context);
+  xq_query_free(query);
+  xq_options_free(options);
+  return status;
+}
+
+static xq_status load(void* data, const char* url, size_t length, xq_purpose purpose,
+                      xq_resource* resource) {
+  (void)data, (void)length, (void)purpose;
+  if (strcmp(url, "archive://m.xq") == 0) {
+    return xq_resource_set_data(
+        resource, "module namespace m = 'urn:m'; declare function m:f($x) { $x + 1 };", XQ_NUL);
+  }
+  return xq_resource_set_data(resource, "<a><b>1</b></a>", XQ_NUL);
+}
+
+static xq_status loading(void) {
+  xq_options* options = NULL;
+  xq_query* query = NULL;
+  xq_context* context = NULL;
+  xq_value* items = NULL;
+  xq_error* error = NULL;
+  xq_status status = xq_options_new(&options);
+  if (!status) status = xq_options_allow_scheme(options, "archive", XQ_NUL);
+  if (!status) status = xq_options_set_loader(options, load, NULL, NULL);
+  if (!status) {
+    status = xq_compile(
+        "import module namespace m = 'urn:m' at 'archive://m.xq';"
+        "m:f(doc('archive://a.xml')/a/b)",
+        XQ_NUL, options, &query, &error);
+  }
+  if (!status) status = xq_context_new(&context);
+  if (!status) status = xq_context_set_options(context, options);
+  if (!status) status = xq_evaluate(context, query, &items, &error);
+  xq_error_free(error);
+  xq_value_free(items);
+  xq_context_free(context);
+  xq_query_free(query);
+  xq_options_free(options);
+  return status;
+}
+
+static xq_status profile(void) {
+  xq_options* options = NULL;
+  xq_query* query = NULL;
+  xq_context* context = NULL;
+  xq_value* items = NULL;
+  xq_profile* made = NULL;
+  xq_error* error = NULL;
+  xq_text text = XQ_TEXT_INIT;
+  xq_status status = xq_options_new(&options);
+  if (!status) status = xq_options_set_way(options, XQ_WAY_PROFILED);
+  if (!status) {
+    status = xq_compile("sum(for $i in 1 to 3 return $i * 2)", XQ_NUL, options, &query, &error);
+  }
+  if (!status) status = xq_context_new(&context);
+  if (!status) status = xq_profile_new(query, &made);
+  if (!status) status = xq_evaluate(context, query, &items, &error);
+  if (!status) status = xq_profile_add(made, context);
+  if (!status) status = xq_profile_describe(made, XQ_PROFILE_JSON, "q", 1, &text);
+  xq_error_free(error);
+  xq_text_free(&text);
+  xq_profile_free(made);
+  xq_value_free(items);
+  xq_context_free(context);
+  xq_query_free(query);
+  xq_options_free(options);
+  return status;
+}
+
+/* HTML is read on a thread of its own, whose allocations do not fail; what surrounds it does. */
+static xq_status html(void) {
+  static const char markup[] = "<p>one<p>two";
+  xq_node* document = NULL;
+  xq_error* error = NULL;
+  xq_text text = XQ_TEXT_INIT;
+  xq_status status = xq_read_memory(markup, strlen(markup), XQ_READ_HTML, &document, &error);
+  if (!status) status = xq_node_string(document, &text);
+  xq_error_free(error);
+  xq_text_free(&text);
+  xq_node_free(document);
+  return status;
+}
+
 #define FAULT_TEST(name)              \
   static void name##_survives(void) { \
     fail_in(#name, name);             \
@@ -205,6 +323,10 @@ FAULT_TEST(failing_query)
 FAULT_TEST(failing_compilation)
 FAULT_TEST(explained)
 FAULT_TEST(making_values)
+FAULT_TEST(stream)
+FAULT_TEST(loading)
+FAULT_TEST(profile)
+FAULT_TEST(html)
 
 const test_case faults_tests[] = {
     {"arithmetic", arithmetic_survives},
@@ -220,5 +342,9 @@ const test_case faults_tests[] = {
     {"a query that does not compile", failing_compilation_survives},
     {"a plan", explained_survives},
     {"making values", making_values_survives},
+    {"a stream", stream_survives},
+    {"modules and documents of a loader", loading_survives},
+    {"a profile", profile_survives},
+    {"HTML", html_survives},
     TEST_END,
 };

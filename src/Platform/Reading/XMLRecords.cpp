@@ -107,8 +107,8 @@ class XMLRecords::Reading {
   Reading(TextSource& source, std::span<const XMLRecordPath> paths, uint32_t options)
       : _pieces(source, options, [this](std::string_view text) { leave(text); }),
         _document(cast<NSXMLDocument>(_pieces.tree().current())),
+        _treeIsDocuments{_pieces},
         _filter(_pieces.tree(), paths) {}
-  ~Reading() { _pieces.letGoOfTree(); }
   Reading(const Reading&) = delete;
   Reading& operator=(const Reading&) = delete;
 
@@ -132,6 +132,11 @@ class XMLRecords::Reading {
   size_t _depth = 0;
   XMLPieces _pieces;
   const Ref<NSXMLDocument> _document;
+  // Whoever refers to the document owns the tree, also where the rest of this could not be made.
+  const struct TreeIsDocuments {
+    ~TreeIsDocuments() { pieces.letGoOfTree(); }
+    XMLPieces& pieces;
+  } _treeIsDocuments;
   XMLRecordFilter _filter;
 };
 
