@@ -14,6 +14,8 @@
 #include <cstring>
 #include <string>
 #include <string_view>
+#include <tuple>
+#include <type_traits>
 
 namespace {
 
@@ -55,6 +57,27 @@ constexpr size_t placesOfKind = 4;
 template <class H>
 using Places = std::array<H*, placesOfKind>;
 
+// One of each kind, to be given where another kind is asked for. They are never freed: a call may
+// free what is in a place before it uses what it was given.
+struct Strays {
+  xq_query* query = nullptr;
+  xq_context* context = nullptr;
+  xq_value* value = nullptr;
+  xq_node* node = nullptr;
+  xq_options* options = nullptr;
+  xq_error* error = nullptr;
+
+  Strays() {
+    xq_query* none = nullptr;
+    const bool areMade = xq_compile("1", 1, nullptr, &query, nullptr) == XQ_OK &&
+                         xq_context_new(&context) == XQ_OK && xq_value_new(&value) == XQ_OK &&
+                         xq_read_memory("<a/>", 4, 0, &node, nullptr) == XQ_OK &&
+                         xq_options_new(&options) == XQ_OK &&
+                         xq_compile("1 +", 3, nullptr, &none, &error) == XQ_ERROR;
+    if (!areMade) fail("a handle cannot be made");
+  }
+};
+
 class Session {
  public:
   explicit Session(Input& input) : _input(input) {}
@@ -71,12 +94,19 @@ class Session {
   H* used(Places<H>& places) {
     const uint8_t which = _input.byte();
     if (which < 250) return places[which % placesOfKind];
-    void* others[] = {_queries[0], _contexts[0], _values[0], _nodes[0], _options[0], _errors[0]};
-    void* other = others[which - 250];
-    for (H* own : places) {
-      if (own == other) return nullptr;
-    }
-    return static_cast<H*>(other);
+    static const Strays strays;
+    const std::tuple others = {strays.query, strays.context, strays.value,
+                               strays.node,  strays.options, strays.error};
+    // One of its own kind would be used, and changed, by one input after the other.
+    const auto asThis = [](auto* other) {
+      return std::is_same_v<decltype(other), H*> ? nullptr : static_cast<void*>(other);
+    };
+    void* const given = std::apply(
+        [&](auto*... other) {
+          return std::array<void*, sizeof...(other)>{asThis(other)...}[which - 250];
+        },
+        others);
+    return static_cast<H*>(given);
   }
   // Frees what is in a place, to put another handle there.
   template <class H>
