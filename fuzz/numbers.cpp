@@ -41,11 +41,24 @@ std::string asciiOf(std::string_view text) {
   return ascii;
 }
 
+// A double is read by the same rule: as the one that is nearest to the number.
+void checkDouble(const std::string& text, bool isNumber, const SlowDecimal* slow) {
+  double value = 0;
+  check(scanDouble(NSStringView::ascii(text), value) == isNumber, "a double to one of them", text);
+  if (!isNumber) return;
+  if (slow) {
+    check(value == std::strtod(slow->text().c_str(), nullptr), "read as another double", text);
+  } else {
+    check(!std::isnan(value), "a number is read as none", text);
+  }
+}
+
 bool read(std::string_view line, Both& out) {
   const std::string text = asciiOf(line);
   bool tooLong = false;
   const bool isNumber = SlowDecimal::scan(text, out.slow, tooLong);
   const bool isTaken = NSDecimal::scan(NSStringView::ascii(text), out.fast);
+  checkDouble(text, isNumber, tooLong ? nullptr : &out.slow);
   if (tooLong) return false;
   check(isTaken == isNumber, "a number to one of them", text);
   if (isNumber) checkSame(out.fast, out.slow, "read differently", out, out);
@@ -120,7 +133,9 @@ void checkPrinting(double value, bool isFloat) {
   check(again == value, "printed and read back as another number", text);
   double scanned = 0;
   check(scanDouble(NSStringView::ascii(text), scanned), "printed as no number", text);
-  if (!isFloat) check(scanned == value, "scanned as another number", text);
+  // The digits of a float are enough for a float.
+  check((isFloat ? double{static_cast<float>(scanned)} : scanned) == value,
+        "scanned as another number", text);
   if (value == 0) return;
   int exponent = 0;
   const int fewest = fewestDigits(value, isFloat, exponent);
@@ -131,6 +146,15 @@ void checkPrinting(double value, bool isFloat) {
   if (isPlain) return;
   const std::string_view tail = std::string_view(text).substr(mark + 1);
   check(tail.size() >= 3 && (tail[0] == '+' || tail[0] == '-'), "an exponent without a sign", text);
+}
+
+// Infinities and what is no number print as nothing that is read as one.
+void checkSpecial(double value) {
+  for (const std::string& text : {formatDouble(value), formatFloat(static_cast<float>(value))}) {
+    double scanned = 0;
+    check(!text.empty() && !scanDouble(NSStringView::ascii(text), scanned), "read as a number",
+          text);
+  }
 }
 
 }  // namespace
@@ -150,7 +174,12 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   double value = 0;
   std::memcpy(&value, &bits, sizeof value);
   for (const double each : {value, a.fast.doubleValue(), a.fast.doubleValue() / 3}) {
-    if (std::isfinite(each)) checkPrinting(each, false);
+    if (std::isfinite(each)) {
+      checkPrinting(each, false);
+    } else {
+      checkSpecial(each);
+    }
+    // What a float does not hold is infinite.
     const auto single = static_cast<float>(each);
     if (std::isfinite(single)) checkPrinting(double{single}, true);
   }

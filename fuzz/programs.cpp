@@ -14,7 +14,6 @@
 #include <chrono>
 #include <cstring>
 #include <string>
-#include <vector>
 
 using namespace xquery;
 using namespace xquery::fuzz;
@@ -23,7 +22,6 @@ using plantest::Outcome;
 namespace {
 
 constexpr uint32_t options = NSXMLNodePreserveWhitespace;
-using Lines = std::vector<std::string>;
 
 XQueryLoading nothing() {
   XQueryLoading loading;
@@ -32,34 +30,19 @@ XQueryLoading nothing() {
 }
 
 XQueryLimits limits(std::chrono::milliseconds duration) {
-  XQueryLimits found;
-  found.duration = duration;
-  found.memoryCeiling = uint64_t{64} << 20;
-  return found;
+  return plantest::boundedBy(duration, uint64_t{64} << 20);
 }
 constexpr std::chrono::milliseconds plainDuration(500);
 constexpr std::chrono::milliseconds otherDuration(8000);
-
-bool endedAtLimit(const Lines& lines) {
-  return std::any_of(lines.begin(), lines.end(), [](const std::string& line) {
-    return line.starts_with("error 0 ") && line.find("limit: ") != std::string::npos;
-  });
-}
 
 // What depends on the moment. (Documents and the network are out of reach.)
 bool isRepeatable(std::string_view program) {
   return program.find("current-") == program.npos && program.find("real-date") == program.npos;
 }
 
-// Without the focus that is left behind, whose document may be less than whole.
-Lines answerOf(Lines lines) {
-  std::erase_if(lines, [](const std::string& line) { return line.starts_with("left "); });
-  return lines;
-}
-
-std::string shown(const Lines& lines) {
+std::string shown(const Outcome& outcome) {
   std::string text;
-  for (const std::string& line : lines) text += "  " + line + "\n";
+  for (const std::string& line : outcome.lines) text += "  " + line + "\n";
   return text;
 }
 
@@ -73,15 +56,16 @@ class Comparison {
     NSXMLParseError failure;
     const auto document = NSXMLDocument::documentWithData(_xml, options, &failure);
     if (!document) return;
-    const Lines expected = outcome(*plain, document, plainDuration);
-    if (endedAtLimit(expected)) return;
+    const Outcome expected = outcome(*plain, document, plainDuration);
+    if (plantest::endedAtLimit(expected)) return;
     const auto planned = compiled(XQueryWay::Planned);
     compare(expected, outcome(*planned, document, otherDuration), "planned");
     compare(expected, outcome(*compiled(XQueryWay::Profiled), document, otherDuration), "profiled");
     const auto part = XQueryProjectedDocumentWithData(*planned, _xml, options, &failure);
     check(part != nullptr, "refused where only a part is needed", failure.message);
-    compare(answerOf(expected), answerOf(outcome(*planned, part, otherDuration)), "projected");
-    compareStream(answerOf(outcome(*plain, document, otherDuration, true)));
+    compare(withoutFocus(expected), withoutFocus(outcome(*planned, part, otherDuration)),
+            "projected");
+    compareStream(withoutIdentity(withoutFocus(expected)));
   }
 
  private:
@@ -89,40 +73,58 @@ class Comparison {
     return XQuery::xqueryWithSource(_program, nothing(), limits(otherDuration), way);
   }
 
-  Lines outcome(const XQuery& query, const Value& document, std::chrono::milliseconds duration,
-                bool isForStream = false) const {
-    const auto context = XQueryContext::xqueryContext();
+  Outcome outcome(const XQuery& query, const Value& document,
+                  std::chrono::milliseconds duration) const {
+    return plantest::outcomeIn(*newContext(duration), query, document);
+  }
+
+  static Ref<XQueryContext> newContext(std::chrono::milliseconds duration) {
+    auto context = XQueryContext::xqueryContext();
     context->contextSetLoading(nothing());
     context->contextSetLimits(limits(duration));
-    if (!isForStream) return plantest::outcomeIn(*context, query, document).lines;
-    Ref<XQueryError> error;
-    const auto items = context->evaluateXQuery(query, {}, document, &error);
-    return linesOf(items, error);
+    return context;
   }
 
-  static Lines linesOf(const Ref<NSArray>& items, const Ref<XQueryError>& error) {
-    Lines lines;
-    if (error) return {errorLine(*error)};
-    for (size_t i = 0; items && i < items->count(); ++i) {
-      lines.push_back(plantest::shownItem(*items->objectAtIndex(i)));
-    }
-    return lines;
-  }
-
-  static std::string errorLine(const XQueryError& error) {
-    return "error " + std::to_string(error.err()) + " " + (error.msg() ? error.msg()->utf8() : "");
-  }
-
-  void compare(const Lines& expected, const Lines& found, const char* way) const {
-    if (expected == found || endedAtLimit(expected) || endedAtLimit(found)) return;
+  void compare(const Outcome& expected, const Outcome& found, const char* way) const {
+    if (expected == found || plantest::endedAtLimit(found)) return;
     fail(std::string(way) + " otherwise than plain",
          std::string(_program) + "\n" + std::string(_xml) + "\nfound\n" + shown(found) +
              "expected\n" + shown(expected));
   }
 
-  void compareStream(const Lines& expected) const {
+  void compareStream(const Outcome& whole) const {
     const auto query = compiled(XQueryWay::Streamed);
     if (query->parseErrors()) return;
+    XQueryStreamFailure failure;
+    Outcome found;
+    const bool isComplete = stream(*query, found, failure);
+    // A query without a value ends without a reason.
+    const std::string& reason = failure.reading.message;
+    check(isComplete || reason.empty(), "read as a whole, but not record by record", reason);
+    if (failure.error) {
+      if (isOfTheWay(*query, *failure.error)) return;
+      found = plantest::outcomeOf(*failure.error);  // items before it were handed out
+    }
+    if (isComplete && failed(whole) && mayEndEarly(*query)) return;
+    compare(whole, found, "streamed");
+  }
+
+  static bool failed(const Outcome& outcome) {
+    return !outcome.lines.empty() && outcome.lines.front().starts_with("error ");
+  }
+
+  // Errors behind the record that decides are not met.
+  static bool mayEndEarly(const XQuery& query) {
+    const std::string description = XQueryStreamDescription(query);
+    const std::string_view result =
+        std::string_view(description).substr(description.find("result: ") + 8);
+    for (const char* each : {"exists", "empty", "some", "every", "items from position"}) {
+      if (result.starts_with(each)) return true;
+    }
+    return false;
+  }
+
+  bool stream(const XQuery& query, Outcome& found, XQueryStreamFailure& failure) const {
     XQueryStreamInput input;
     input.options = options;
     input.read = [left = _xml](char* buffer, size_t size) mutable {
@@ -130,24 +132,22 @@ class Comparison {
       left.remove_prefix(count);
       return static_cast<ptrdiff_t>(count);
     };
-    const auto context = XQueryContext::xqueryContext();
-    context->contextSetLoading(nothing());
-    context->contextSetLimits(limits(otherDuration));
-    XQueryStreamFailure failure;
-    Lines found;
-    const bool isComplete = context->evaluateStream(
-        *query, {}, input,
-        [&](const Value& item) {
-          found.push_back(plantest::shownItem(*item));
-          return true;
-        },
-        failure);
-    if (!isComplete && !failure.error) return;  // a document that is not read so
-    if (failure.error) found = {errorLine(*failure.error)};
-    // The names of the way to the records are looked up before the first is read, even those that
-    // the document has no place for.
-    if (failure.error && failure.error->number() == XQueryErrorNumber::UnresolvedName) return;
-    compare(expected, found, "streamed");
+    const auto receive = [&](const Value& item) {
+      found.lines.push_back(plantest::shownItem(*item));
+      return true;
+    };
+    return newContext(otherDuration)->evaluateStream(query, {}, input, receive, failure);
+  }
+
+  // The names of the way to the records are looked up before the first is read, even those that the
+  // document has no place for.
+  static bool isOfTheWay(const XQuery& query, const XQueryError& error) {
+    if (error.number() != XQueryErrorNumber::UnresolvedName) return false;
+    const std::string message = error.msg()->utf8();
+    const size_t start = message.find('"') + 1;
+    const std::string name = message.substr(start, message.rfind('"') - start);
+    const std::string description = XQueryStreamDescription(query);
+    return description.substr(0, description.find('\n')).find(name) != description.npos;
   }
 
   std::string_view _program;
