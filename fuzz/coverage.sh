@@ -20,10 +20,10 @@ for source in *.cpp; do
     [ -d "$folder" ] && folders+=("$folder")
   done
   [ ${#folders[@]} -gt 0 ] || continue
-  # Each input once; an input that fails or hangs does not take the others' counts with it.
+  # Each input once. What fails or hangs on one of them counts for nothing, and is told.
   LLVM_PROFILE_FILE="$out/$target.%p.profraw" \
     "$out/fuzz_$target" -runs=0 -timeout=60 "${folders[@]}" >"$out/$target.log" 2>&1 ||
-    echo "$target failed; see $out/$target.log" >&2
+    { echo "$target failed; see $out/$target.log" >&2; status=1; }
   objects+=(-object "$out/fuzz_$target")
 done
 llvm-profdata merge -sparse "$out"/*.profraw -o "$out/all.profdata" || exit 1
