@@ -1,20 +1,25 @@
 #!/usr/bin/env bash
-# coverage.sh [CORPORA]: what the inputs of all fuzz targets reach, for each room of src/: their seeds,
-# and what they have learnt under CORPORA/TARGET (build/fuzz/corpus unless given). Prints a table of
-# lines and branches; the lines that nothing reaches are in build/coverage/unreached.txt.
+# coverage.sh [CORPORA [TARGET...]]: what the inputs of fuzz targets, those named or all, reach, for
+# each room of src/ that is linked to one: their seeds, and what they have learnt under CORPORA/TARGET
+# (build/fuzz/corpus unless given). Prints a table of lines and branches; the lines that nothing
+# reaches are in build/coverage/unreached.txt. The status is 1 when a target fails on an input.
 set -u
 . "$(dirname "${BASH_SOURCE[0]}")/../cmake/prepare.sh"
 
 corpora=$(realpath -m "${1:-$top/build/fuzz/corpus}")
+[ $# -gt 0 ] && shift
 need_packages "${packages[@]}" clang libclang-rt-dev llvm || exit 1
-(build coverage -- fuzzers) || exit 1
 
 cd "$top/fuzz" || exit 1
+targets=("$@")
+[ ${#targets[@]} -gt 0 ] || targets=(*.cpp)
+targets=("${targets[@]%.cpp}")
+(build coverage -- "${targets[@]/#/fuzz_}") || exit 1
 out=$top/build/coverage
+status=0
 rm -f "$out"/*.profraw
 objects=()
-for source in *.cpp; do
-  target=${source%.cpp}
+for target in "${targets[@]}"; do
   folders=()
   for folder in "seeds/$target" "$corpora/$target"; do
     [ -d "$folder" ] && folders+=("$folder")
@@ -53,3 +58,4 @@ awk -v top="$top/src/" -v unreached="$out/unreached.txt" '
         branches[name] ? 100 * taken[name] / branches[name] : 0 | "sort"
     }
   }' "$out/all.lcov"
+exit $status
