@@ -161,7 +161,8 @@ std::string ProgramGenerator::path(int depth) {
   for (size_t i = 0; i < steps; ++i) text += step(depth);
   if (_random.below(8) == 0) {
     text += _random.oneOf({"/position()", "/last()", "/string(position())", "/data(.)", "/(., 1)",
-                           "/concat(position(), last())"});
+                           "/concat(position(), last())", "/string(@x)", "/name()",
+                           "/xs:integer(@x)", "/(if (@x) then a else b)/string()"});
   }
   if (_random.below(8) == 0) text += "/(" + expr(depth - 1) + ")";
   return text;

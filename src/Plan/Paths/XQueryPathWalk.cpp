@@ -26,6 +26,11 @@ bool descendantsAreSubtree(const NSXMLNode* node) {
   return XQueryDescendantStop(node) || !node->parent() || !node->parent()->parent();
 }
 
+// The first predicate to be asked of what is looked up.
+size_t firstAsked(const XQueryWalkedStep& step) {
+  return step.predicatesInTest + step.lookup->answers();
+}
+
 bool isOnlyChild(const NSXMLNode* node) {
   return !node->previousSibling() && !node->nextSibling();
 }
@@ -142,9 +147,11 @@ void XQueryPathWalk::takeNode(size_t index, NSXMLNode* node) {
   XQueryCheckStack(context);
   if (setsEveryFocus || step.testMayRaise) _internal(context).setContextItem(node, 0);
   if (absorbsNext(step, node)) {
-    if (_steps[index + 1].countsBelow) return takeCountedBelow(index + 1, node);
     const bool isChild = _steps[index + 1].axis == XQueryAxisChild;
-    take(index + 1, isChild ? XQueryAxisDescendant : XQueryAxisAttributesBelow, node);
+    const int axis = isChild ? XQueryAxisDescendant : XQueryAxisAttributesBelow;
+    if (_steps[index + 1].arrivesByParents) return takeByParents(index + 1, axis, node);
+    if (_steps[index + 1].countsBelow) return takeCountedBelow(index + 1, node);
+    take(index + 1, axis, node);
   } else {
     take(index, step.axis, node);
   }
@@ -163,61 +170,11 @@ void XQueryPathWalk::takeItem(size_t index, NSObject* item, int64_t position, bo
 bool XQueryPathWalk::absorbsNext(const XQueryWalkedStep& step, const NSXMLNode* node) const {
   const bool isOpen =
       step.absorbsNext && orderIsFree && !setsEveryFocus && descendantsAreSubtree(node);
-  if (!isOpen || !(&step + 1)->countsBelow) return isOpen;
+  const XQueryWalkedStep& next = *(&step + 1);
+  if (!isOpen || (!next.countsBelow && !next.arrivesByParents)) return isOpen;
   // Parents are told apart by their order.
-  return !listingStep &&
+  return (!next.countsBelow || !listingStep) &&
          (!node->firstChild() || NSXMLNodeOrder::areComparable(node, node->firstChild()));
-}
-
-// Parents that are open, the innermost last, with the number of their children met so far. Children
-// are met in document order, so that a parent that comes after another child's is done with.
-class XQueryPathWalk::ChildCounts {
- public:
-  // The position of the node among those of its parent.
-  uint64_t countFor(const NSXMLNode* node) {
-    const NSXMLNode* parent = node->parent();
-    while (!_open.empty() && _open.back().parent != parent &&
-           isDone(*_open.back().parent, *parent)) {
-      _open.pop_back();
-    }
-    if (_open.empty() || _open.back().parent != parent) _open.push_back({parent, 0});
-    return ++_open.back().count;
-  }
-
- private:
-  struct Parent {
-    const NSXMLNode* parent;
-    uint64_t count;
-  };
-
-  static bool isDone(const NSXMLNode& one, const NSXMLNode& next) {
-    if (NSXMLNodeOrder::number(one) > NSXMLNodeOrder::number(next)) return true;
-    const NSXMLNode* behind = one.nextSibling();
-    return behind && NSXMLNodeOrder::number(*behind) <= NSXMLNodeOrder::number(next);
-  }
-
-  std::vector<Parent, ValueAllocator<Parent>> _open;
-};
-
-void XQueryPathWalk::takeCountedBelow(size_t index, NSXMLNode* node) {
-  const XQueryWalkedStep& step = _steps[index];
-  const uint64_t position = *step.step->literalPosition(step.predicatesInTest);
-  XQueryStepTest test(step, *this);
-  ChildCounts counts;
-  const auto act = [&](NSXMLNode* found) {
-    if (counts.countFor(found) != position) return true;
-    if (!keepsAlone(step, step.predicatesInTest + 1, found)) return !hasFailed;
-    takeNode(index + 1, found);
-    return !isOver();
-  };
-  if (const NSXMLExpandedName* name = test.onlyName()) {
-    XQueryWalkAxis(node, XQueryAxisDescendant, XQueryNamedVisit(name, act));
-  } else if (test.onlyNames()) {
-    XQueryWalkAxis(node, XQueryAxisDescendant, XQueryChoiceVisit(test, act));
-  } else {
-    XQueryWalkAxis(node, XQueryAxisDescendant,
-                   [&test, act](NSXMLNode* found) { return !test.matches(found) || act(found); });
-  }
 }
 
 void XQueryPathWalk::take(size_t index, int axis, NSXMLNode* node) {
@@ -230,20 +187,26 @@ void XQueryPathWalk::take(size_t index, int axis, NSXMLNode* node) {
   }
 }
 
-// False where the step has to walk.
-bool XQueryPathWalk::takeLookedUp(size_t index, int axis, NSXMLNode* node) {
-  const XQueryWalkedStep& step = _steps[index];
+// Lists what the step is to ask of; false where it has to walk.
+bool XQueryPathWalk::lookUp(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
+                            std::vector<NSXMLNode*>& nodes) {
   const bool isOpen =
       axis == XQueryAxisChild || axis == XQueryAxisDescendant || axis == XQueryAxisAttributesBelow;
-  if (!isOpen || listingStep || setsEveryFocus) return false;
+  if (!step.lookup || !isOpen || listingStep || setsEveryFocus) return false;
   // Diagnostics would show an error of the value twice.
   if (_internal(context).showsErrors()) return false;
   XQueryStepTest test(step, *this);
+  return step.lookup->find(node, axis, test, context, nodes);
+}
+
+// False where the step has to walk.
+bool XQueryPathWalk::takeLookedUp(size_t index, int axis, NSXMLNode* node) {
+  const XQueryWalkedStep& step = _steps[index];
   std::vector<NSXMLNode*>& nodes = openNodeList();
-  const bool areFound = step.lookup->find(node, axis, test, context, nodes);
+  const bool areFound = lookUp(step, axis, node, nodes);
   if (areFound && filtersEach(step)) {
     takeEachKept(index, nodes);
-  } else if (areFound && filterNodes(step, step.predicatesInTest, nodes)) {
+  } else if (areFound && filterNodes(step, firstAsked(step), nodes)) {
     takeNodes(index + 1, nodes);
   } else {
     hasFailed = hasFailed || areFound;
@@ -257,7 +220,7 @@ void XQueryPathWalk::takeEachKept(size_t index, std::span<NSXMLNode* const> node
   WorkPacer pacer;
   for (NSXMLNode* node : nodes) {
     pacer.turn();
-    if (keepsAlone(step, step.predicatesInTest, node)) takeNode(index + 1, node);
+    if (keepsAlone(step, firstAsked(step), node)) takeNode(index + 1, node);
     if (isOver()) return;
   }
 }

@@ -19,6 +19,11 @@
 //                 parent), so the child step takes the descendant axis only when no predicate can
 //                 tell, both are repeatable with all steps after them, and the results will be
 //                 sorted. "//@a" is the same.
+//   arrivesByParents
+//                 Where an expression stands behind, as in "//a/string()", the order in which nodes
+//                 arrive, and how often, is that of the items of the path. So what the descendant
+//                 axis finds in place of "//" and a child step is gathered, filtered, put into the
+//                 order of its parents, and handed on parent by parent.
 //   countsBelow   "//a[2]" is the same where it begins the path and starts from one node: the
 //                 descendants named a are counted by their parents, which come in document order.
 //   lookup        Where a predicate asks for a value that the index of the tree has, the step takes
@@ -100,6 +105,13 @@ class XQueryPathWalk : public XQueryPathRun {
   void takeItem(size_t index, NSObject* item, int64_t position, bool validate);
   void take(size_t index, int axis, NSXMLNode* node);
   void takeCountedBelow(size_t index, NSXMLNode* node);
+  template <class Act>
+  void visitCountedBelow(size_t index, NSXMLNode* node, Act act);
+  void takeByParents(size_t index, int axis, NSXMLNode* node);
+  bool gatherBelow(size_t index, int axis, NSXMLNode* node, std::vector<NSXMLNode*>& nodes);
+  void handOnByParents(size_t index, std::span<NSXMLNode* const> nodes);
+  bool lookUp(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
+              std::vector<NSXMLNode*>& nodes);
   bool takeLookedUp(size_t index, int axis, NSXMLNode* node);
   void takeEachKept(size_t index, std::span<NSXMLNode* const> nodes);
   void stream(size_t index, int axis, NSXMLNode* node);

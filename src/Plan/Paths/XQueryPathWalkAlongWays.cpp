@@ -3,12 +3,14 @@
 // Children of children of the document, and descendants of these, by their names: each element that
 // they find lies on one way (Platform/Tree/NameIndex.h), and each is found once in the results. All
 // of them arrive in document order, which is that of children of children; where steps go deeper,
-// the order has to be free.
+// the order has to be free, and how often a node arrives must not show, as it does in what an
+// expression behind them answers for it.
 #include "Expr/Paths/XQueryPathResults.h"
 #include "Plan/Paths/XQueryPathWalk.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/TreeIndexes.h"
 
+#include <algorithm>
 #include <array>
 
 namespace xquery {
@@ -17,6 +19,9 @@ namespace xquery {
 class XQueryPathWalk::Ways {
  public:
   explicit Ways(XQueryPathWalk& walk) : _walk(walk) {
+    const bool arrivalShows =
+        std::any_of(walk._steps.begin(), walk._steps.end(),
+                    [](const XQueryWalkedStep& step) { return step.isExpression(); });
     bool isDeep = false;
     for (size_t index = 0; index < walk._steps.size() && _count < most; ++index) {
       const XQueryWalkedStep& step = walk._steps[index];
@@ -27,8 +32,9 @@ class XQueryPathWalk::Ways {
       }
       isDeep = isDeep || step.axis == XQueryAxisDescendant;
       if (step.axis != XQueryAxisChild && step.axis != XQueryAxisDescendant) return;
-      if (step.hasPredicates() && !step.filtersEach) return;
-      if ((isDeep && !walk.orderIsFree) || !add(step, isDeep)) return;
+      if (step.hasPredicates() && (!step.filtersEach || isBeforeExpression(index))) return;
+      if (isDeep && (arrivalShows || !walk.orderIsFree)) return;
+      if (!add(step, isDeep)) return;
       _steps[_count - 1] = index + 1;
       if (step.hasPredicates() && !areAnswered(step)) return;
       isDeep = false;
@@ -68,6 +74,10 @@ class XQueryPathWalk::Ways {
     XQueryPathWalk* walk = nullptr;
   };
 
+  // What it hands on is a list, of which the expression may ask for positions.
+  bool isBeforeExpression(size_t index) const {
+    return index + 1 < _walk._steps.size() && _walk._steps[index + 1].isExpression();
+  }
   // Of nodes that are wanted by themselves, those of a name are asked in their turn.
   bool areAnswered(const XQueryWalkedStep& step) const {
     return step.asksForWays && _walk.results.countsOnly();

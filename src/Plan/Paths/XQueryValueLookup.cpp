@@ -92,8 +92,17 @@ Value valueFrom(const XQueryExpr& probe, NSXMLNode* node, XQueryContext& context
 }  // namespace
 
 XQueryValueLookup::XQueryValueLookup(Of of, const NSXMLExpandedName* name,
-                                     const XQueryValueWay& way, Probe probe)
-    : _of(of), _name(name), _way(way), _key(keyOf(of, name, way)), _probe(std::move(probe)) {}
+                                     const XQueryValueWay& way, Probe probe, First first)
+    : _of(of),
+      _name(name),
+      _way(way),
+      _key(keyOf(of, name, way)),
+      _probe(std::move(probe)),
+      _first(first) {}
+
+bool XQueryValueLookup::isReady(const NSXMLNode* root) const {
+  return _probe.areTexts && NSXMLIndexedValues::of(_key, root, nullptr).values != nullptr;
+}
 
 // Numbers and dates are compared with what a text means, "eq" refuses several values, and what has
 // no value is not in the index: walking must tell.
@@ -160,6 +169,7 @@ bool XQueryValueLookup::find(NSXMLNode* node, int axis, XQueryStepTest& test,
   // No index is made for what it cannot answer.
   const Value value = valueFrom(*_probe.expr, node, context);
   const XQueryItemList probes(value.get());
+  if (value && probes.count() == 0 && _first == First::Holds) return true;
   if (!value || !areTexts(probes)) return false;
   const auto indexed = NSXMLIndexedValues::of(_key, range.first, range.stop);
   if (!indexed.values) return false;

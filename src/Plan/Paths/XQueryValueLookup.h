@@ -2,7 +2,8 @@
 // "item[description//emph = 'x']" and "*[author/last = $name]" do, from the index of the tree.
 //
 // What is found are candidates: all nodes, among those that the step would walk to, for which the
-// condition can hold. Whoever asks goes on to filter them as if they had been walked to.
+// condition can hold. Whoever asks goes on to filter them as if they had been walked to. Where a
+// predicate is nothing but "K = P", it holds for all of them, and need not be asked.
 //
 // Elements of one name have an index of their own (Platform/Tree/ValueIndex.h). Where the step
 // takes others as well, what has the value is found first, and the way from there goes up:
@@ -36,10 +37,21 @@ class XQueryValueLookup {
     bool meetsNoneWhenEmpty = false;
     // Of several values it is enough to equal one; otherwise they are an error.
     bool takesSeveral = false;
+    // Whatever it comes to are texts, if it does not fail.
+    bool areTexts = false;
   };
+  // The first predicate that is not part of the test holds for all candidates; or not surely.
+  enum class First : uint8_t { Asked, Holds };
 
   // `name` is that of the elements or attributes, null for any.
-  XQueryValueLookup(Of of, const NSXMLExpandedName* name, const XQueryValueWay& way, Probe probe);
+  XQueryValueLookup(Of of, const NSXMLExpandedName* name, const XQueryValueWay& way, Probe probe,
+                    First first);
+
+  // How many predicates need not be asked of candidates.
+  size_t answers() const { return _first == First::Holds ? 1 : 0; }
+  // Whether what lies below the root of a tree will be found in an index, which is there or is made
+  // now, and not walked to.
+  bool isReady(const NSXMLNode* root) const;
 
   // Lists the candidates that the axis, which is child, descendant or, for attributes, "//@a",
   // leads to from the node, in document order; the list is empty before. False, and nothing listed,
@@ -63,6 +75,7 @@ class XQueryValueLookup {
   const XQueryValueWay _way;
   const NSXMLValueKey _key;
   const Probe _probe;
+  const First _first;
 };
 
 }  // namespace xquery

@@ -281,7 +281,8 @@ XQueryWalkedPath::Answer XQueryWalkedPath::walk(XQueryContext& context, Value& i
   walk.startsFromOne = isa<NSXMLNode>(items.get());
   walk.orderIsFree = dynamic.ordered();
   if (results.mayEndEarly() && !mayEndEarly(items, walk)) results.takeAll();
-  const bool isTaken = _picker ? pickNodes(items, walk) : walk.takeAlongWays(items);
+  const bool isPicked = _picker && !looksUpAll(items, walk);
+  const bool isTaken = isPicked ? pickNodes(items, walk) : walk.takeAlongWays(items);
   if (!isTaken) {
     walk.takeValue(0, items, true);
     walk.noteMet();
@@ -378,6 +379,19 @@ bool XQueryWalkedPath::listNodesBefore(const XQueryStep& step, XQueryContext& co
   XQueryPathResults results;
   XQueryPathWalk walk(_steps, _trailCount, results, context);
   return isNull(start) || listNodes(start, *last, walk, nodes);
+}
+
+// Whether the index of the tree answers at once what tables of the nodes, which every evaluation
+// has to make for itself, would answer: all predicates of a step that goes down from the document.
+bool XQueryWalkedPath::looksUpAll(const Value& start, const XQueryPathWalk& walk) const {
+  const auto* document = dyn_cast<NSXMLDocument>(start.get());
+  const XQueryWalkedStep* step = walked(*_pickedStep);
+  if (!document || !step || !step->lookup || walk.setsEveryFocus) return false;
+  const auto index = step - _steps.data();
+  const bool isBelow = index == 0 ? step->axis == XQueryAxisDescendant
+                                  : index == 1 && walk.absorbsNext(_steps.front(), document);
+  const size_t asked = step->step->predicates().size() - step->predicatesInTest;
+  return isBelow && step->lookup->answers() == asked && step->lookup->isReady(document);
 }
 
 // The same for the nodes that reach the picked step: hands on what is left.

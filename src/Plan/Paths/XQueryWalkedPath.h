@@ -109,6 +109,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
                  std::vector<Value>& listed) const;
   bool pickItems(Value& items, XQueryContext& context, std::optional<uint64_t>* number) const;
   bool pickNodes(const Value& start, XQueryPathWalk& walk) const;
+  bool looksUpAll(const Value& start, const XQueryPathWalk& walk) const;
   bool showsErrors(const XQueryContext& context) const;
 
   const Ref<XQueryPathExpr> _path;

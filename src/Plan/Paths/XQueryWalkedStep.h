@@ -79,6 +79,7 @@ struct XQueryWalkedStep {
 
   // See XQueryPathWalk.h.
   bool absorbsNext = false;
+  bool arrivesByParents = false;
   bool countsBelow = false;
   bool filtersEach = false;
   bool asksForWays = false;

@@ -3,7 +3,10 @@
 // Pattern     steps at the end of a path, as far to the front as what follows can be repeated: no
 //             expressions among them, no names that may raise an error
 // Facts       of predicates: whether they are repeatable, read what other steps set, ask for a
-//             position or a size, may answer a number, load documents; what they leave in variables
+//             position or a size, may answer a number, load documents; what they leave in variables.
+//             Of steps before an expression, at which nodes are to arrive in the same order and as
+//             often: all predicates and expressions of the path are repeatable, and none reads what
+//             another one sets
 // Operator    none: XQueryWalkedPath is told which of its shortcuts are open
 // Why         see XQueryPathWalk.h. Predicates that are asked less often, or in another order,
 //             leave other values in the variables of their quantifiers, which nobody may read
@@ -76,9 +79,10 @@ class Search {
     for (XQueryPlaceID part = planning.program.firstPart(place); part != XQueryNoPlace;
          part = planning.program.nextPart(part)) {
       const XQueryPlace& at = planning.program[part];
-      if (at.role != XQueryRole::Predicate || !at.step) continue;
-      const XQueryWalkedStep* step = path.walked(*at.step);
-      if (step) _predicates[static_cast<size_t>(step - _steps.data())].push_back(part);
+      const XQueryWalkedStep* step = at.step ? path.walked(*at.step) : nullptr;
+      if (!step) continue;
+      if (at.role == XQueryRole::Step && step->isExpression()) _expressions.push_back(part);
+      if (at.role == XQueryRole::Predicate) _predicates[indexOf(*step)].push_back(part);
     }
   }
 
@@ -105,6 +109,7 @@ class Search {
       findings.countsNodes = i == 0 && !loadsDocuments;
     }
     findings.findsInOrder = findings.countsNodes && arriveInOrder(_steps);
+    keepArrivals();
     note();
     return findings;
   }
@@ -122,6 +127,10 @@ class Search {
     bool loads = false;
     XQueryVariableSet reads;
   };
+
+  size_t indexOf(const XQueryWalkedStep& step) const {
+    return static_cast<size_t>(&step - _steps.data());
+  }
 
   void look(size_t index) {
     const XQueryWalkedStep& step = _steps[index];
@@ -157,6 +166,51 @@ class Search {
     if (!of.areRepeatable || of.reads.meets(_assigned)) return false;
     return !_anythingMayChange || (of.reads.isEmpty() && !of.readGlobals);
   }
+
+  // --- before an expression
+
+  // What an expression answers for the nodes that arrive at it are the items of the path, so these
+  // have to be the same nodes, as often, in the same order; then nothing can tell that predicates
+  // have been asked of all of them beforehand.
+  void keepArrivals() {
+    const auto expression =
+        std::find_if(_steps.begin(), _steps.end(),
+                     [](const XQueryWalkedStep& step) { return step.isExpression(); });
+    if (expression == _steps.end() || !areIdleExpressions()) return;
+    for (auto step = _steps.begin(); step != expression; ++step) {
+      const size_t index = indexOf(*step);
+      step->filtersEach = step->hasPredicates() && _of[index].areOfTruth;
+      if (!step->isDescendantShorthand() || step + 1 == expression) continue;
+      XQueryWalkedStep& next = step[1];
+      next.countsBelow = index == 0 && startsFromOne() && mayCountBelow(index + 1);
+      step->absorbsNext = next.countsBelow || mayTakeDescendants(index + 1);
+      next.arrivesByParents = step->absorbsNext;
+    }
+  }
+
+  bool areIdleExpressions() const {
+    XQueryVariableSet reads;
+    XQueryVariableSet assigned;
+    const auto isIdle = [&](XQueryPlaceID place) {
+      const XQueryFacts& facts = _planning.facts[place];
+      reads.add(facts.reads);
+      assigned.add(facts.assigns);
+      return facts.isRepeatable();
+    };
+    size_t expressions = 0;
+    for (const XQueryWalkedStep& step : _steps) {
+      const size_t index = indexOf(step);
+      const auto& predicates = _predicates[index];
+      if (step.isExpression()) ++expressions;
+      if (step.testMayRaise || !_of[index].areRepeatable) return false;
+      if (predicates.size() != step.step->predicates().size()) return false;
+      if (!std::all_of(predicates.begin(), predicates.end(), isIdle)) return false;
+    }
+    return expressions == _expressions.size() &&
+           std::all_of(_expressions.begin(), _expressions.end(), isIdle) && !reads.meets(assigned);
+  }
+
+  // ---
 
   // Whether the step may walk the descendants of a node in place of the children of each of them,
   // or the attributes below it.
@@ -221,6 +275,7 @@ class Search {
   Steps& _steps;
   std::vector<std::vector<XQueryPlaceID>> _predicates;  // by step
   std::vector<OfPredicates> _of;                        // by step
+  std::vector<XQueryPlaceID> _expressions;              // in place of steps
   XQueryVariableSet _assigned;
   bool _anythingMayChange = false;
 };

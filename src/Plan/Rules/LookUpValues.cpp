@@ -6,14 +6,15 @@
 //             P let ... where C"
 // Facts       of the step: all predicates ask for truth, whatever place a node has, and can be
 //             repeated with all steps behind; of the value that is asked for: it is repeatable and
-//             does not read the focus, but for the root in a predicate; of a clause: it has neither
-//             position nor type, what is left in its variable cannot be told, and let clauses
-//             behind it cannot fail
+//             does not read the focus, but for the root in a predicate, or where the path begins
+//             at it; of a clause: it has neither position nor type, what is left in its variable
+//             cannot be told, and let clauses behind it cannot fail
 // Operator    none: the step is told by which key its nodes are found (XQueryValueLookup)
 // Why         untyped values are compared with texts by their texts, and equal texts are what the
-//             index answers; its candidates are asked the condition as before. A node that is none
-//             makes the condition false, or an error in a predicate, which drops it as well. With a
-//             probe that is no text, and while there is no index, the step walks
+//             index answers; its candidates are asked the condition as before, unless it says no
+//             more. A node that is none makes the condition false, or an error in a predicate,
+//             which drops it as well. With a probe that is no text, and while there is no index,
+//             the step walks
 #include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryNameTest.h"
@@ -104,6 +105,7 @@ class Search {
     if (!path || !isIdleButForErrors(firstConditionOf(where))) return;
     origin.varID = clause->varID();
     origin.errorExcludes = false;
+    origin.isInTreeOfFocus = path->start() && isa<XQueryRootStep>(path->start());
     leftovers.add(origin.own);
     leftovers.add(clause->varID());
     XQueryWalkedStep& step = path->changeableSteps().back();
@@ -190,9 +192,15 @@ class Search {
     const Target target = targetOf(path, step);
     const auto found = conditionFor(condition, origin, target);
     if (!found) return false;
+    const auto& predicates = step.step->predicates();
+    const bool isFirst = step.hasPredicates() && origin.varID == 0 &&
+                         _program[condition].slot == &predicates[step.predicatesInTest];
+    using First = XQueryValueLookup::First;
     step.lookup = std::make_unique<const XQueryValueLookup>(
         target.of, target.name, found->way,
-        XQueryValueLookup::Probe{found->probe, found->meetsNoneWhenEmpty, found->takesSeveral});
+        XQueryValueLookup::Probe{found->probe, found->meetsNoneWhenEmpty, found->takesSeveral,
+                                 found->areTexts},
+        isFirst && found->isAll ? First::Holds : First::Asked);
     return true;
   }
 

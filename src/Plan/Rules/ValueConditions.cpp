@@ -112,10 +112,12 @@ class Search {
     if (right == XQueryNoPlace || XQueryOperatorExpr::rangeIn(comparison.right())) {
       return std::nullopt;
     }
-    const bool takesOne = type == XQueryOperatorEq && !from.origin.errorExcludes;
-    Found found = ofOperands(left, right, takesOne, from);
-    if (!found) found = ofOperands(right, left, takesOne, from);
-    if (found) found->takesSeveral = type == XQueryOperatorEqual;
+    const bool isOfOne = type == XQueryOperatorEq;
+    Found found = ofOperands(left, right, isOfOne, from);
+    if (!found) found = ofOperands(right, left, isOfOne, from);
+    if (!found) return found;
+    found->takesSeveral = !isOfOne;
+    found->isAll = found->isAll && level == 0;
     return found;
   }
 
@@ -149,14 +151,17 @@ class Search {
     }
   }
 
-  // With `takesOne` a key of several values is an error to be seen.
-  Found ofOperands(XQueryPlaceID key, XQueryPlaceID probe, bool takesOne, const Start& from) const {
+  // `isOfOne`: a key of several values is an error, which may be one to be seen.
+  Found ofOperands(XQueryPlaceID key, XQueryPlaceID probe, bool isOfOne, const Start& from) const {
     XQueryValueCondition found{from.way, {}};
     key = inside(key);
     if (!isProbe(probe, from) || !readKey(key, from, found)) return std::nullopt;
     const XQueryPlaceID value = boundByLet(key, from);
     const bool isOne = facts(value).most <= 1 || isTextOfOne(value);
-    if (takesOne && !isOne) return std::nullopt;
+    if (isOfOne && !isOne && !from.origin.errorExcludes) return std::nullopt;
+    found.isAll = isBare(key, from) && (isOne || !isOfOne);
+    found.areTexts =
+        facts(probe).are(XQueryItems::Node | XQueryItems::Untyped | XQueryItems::String);
     found.probe = from.caller ? probeOfCall(probe, from) : _planning.exprAt(probe);
     return found.probe ? Found(std::move(found)) : std::nullopt;
   }
@@ -165,12 +170,19 @@ class Search {
     const XQueryFacts& probe = facts(place);
     using namespace XQueryDeeds;
     // All that a predicate looks at is in the tree of its context item, as are its ways.
-    const bool isInPredicate = from.origin.errorExcludes && !from.caller;
-    const unsigned unknown = ReadsFocus & ~(isInPredicate ? unsigned{ReadsRoot} : 0U);
+    const bool sharesRoot = from.origin.isInTreeOfFocus && !from.caller;
+    const unsigned unknown = ReadsFocus & ~(sharesRoot ? unsigned{ReadsRoot} : 0U);
     return isIdleButForErrors(place) && !probe.does(unknown) && probe.assigns.isEmpty() &&
            !probe.reads.meets(from.own) &&
            probe.mayBe(XQueryItems::Node | XQueryItems::Untyped | XQueryItems::String);
   }
+  // Whether the key is nothing but a way from the context item of a predicate.
+  bool isBare(XQueryPlaceID key, const Start& from) const {
+    XQueryValueWay way;
+    return !from.caller && from.origin.varID == 0 && readPath(*_program[key].expr, from, way) &&
+           way.isOfChildren();
+  }
+
   bool isIdleButForErrors(XQueryPlaceID place) const {
     return facts(place).isRepeatable() && !facts(place).does(XQueryDeeds::LoadsDocuments);
   }
@@ -278,6 +290,7 @@ class Search {
       Start inner{{}, from.way, {}, place, &from};
       inner.origin.varID = params[index]->varID();
       inner.origin.errorExcludes = from.origin.errorExcludes;
+      inner.origin.isInTreeOfFocus = from.origin.isInTreeOfFocus;
       inner.own.add(inner.origin.varID);
       const XQueryExpr& argument = *_program[inside(arguments[index])].expr;
       if (!inner.own.isExact() || !readPath(argument, from, inner.way)) continue;

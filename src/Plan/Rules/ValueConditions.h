@@ -11,11 +11,13 @@ namespace xquery {
 // The condition holds only where the way leads to a value that equals the probe.
 struct XQueryValueCondition {
   XQueryValueWay way;
-  // Repeatable; does not read the focus, but for the root above the context item where an error in
-  // the condition excludes the node, too.
+  // Repeatable; does not read the focus, but for the root above the context item where that is the
+  // one above the node, too.
   Ref<XQueryExpr> probe;
   bool meetsNoneWhenEmpty = false;  // or where it leads to none and the probe is the empty text
   bool takesSeveral = false;        // the probe may be several values, of which one is equal
+  bool areTexts = false;            // the probe comes to nothing but texts
+  bool isAll = false;               // the condition says no more than that, and cannot fail there
 };
 
 // Whose values a condition asks for.
@@ -25,6 +27,8 @@ struct XQueryValueOrigin {
   // An error in the condition excludes the node, too. Otherwise there is none for those that are
   // excluded.
   bool errorExcludes = true;
+  // What it holds lies in the tree of the context item of the condition.
+  bool isInTreeOfFocus = true;
 };
 
 // Finds such a condition among what has to hold for this one: in "K = P" and "K eq P", on either
