@@ -397,6 +397,24 @@ TEST(Sets, AnswerForManyItems) {
   EXPECT_EQ(setsIn("let $ids := //b/@p return //p[@id != $ids]"), 0U);
 }
 
+// Of a long list that is never seen again each item is looked up in a set of the other one, which
+// has at least 64.
+TEST(Sets, AreOfTheListThatComesAgain) {
+  for (const char* few :
+       {"for $i in 1 to 80 return concat('p', 3 * $i)", "for $i in 1 to 80 return $i div 2",
+        "for $i in 1 to 80 return 1e0 * $i", "(xs:token('p3'), 1 to 80)"}) {
+    for (const char* many : {"for $j in 1 to 210 return concat('p', $i * $j mod 7)",
+                             "for $j in 1 to 210 return 1000 + $i * ($j mod 50)",
+                             "(for $j in 1 to 210 return 'q', 'p3', xs:date('2000-01-01'))",
+                             "(for $j in 1 to 210 return number('x'), 21)"}) {
+      const std::string head = "let $few := (" + std::string(few) + ") for $i in 1 to 2 return ";
+      const std::string list = "(" + std::string(many) + ")";
+      resultOf(head + "(" + list + " = $few)");
+      resultOf(head + "($few >= " + list + ")");
+    }
+  }
+}
+
 // --- the switch ----------------------------------------------------------------------------------
 
 TEST(Joins, ThereAreNoneInThePlainWay) {

@@ -51,9 +51,11 @@ void keepDistinct(std::vector<Key>& probes) {
 
 // Of the probes those that decide.
 template <class Key>
-void keepDeciding(XQueryRelation relation, std::vector<Key>& probes) {
-  if (relation.test == XQueryRelation::Equal) return keepDistinct(probes);
-  if (!probes.empty()) probes.assign(1, decidingProbe(relation, probes));
+void keepDeciding(XQueryRelation relation, bool isDistinct, std::vector<Key>& probes) {
+  if (relation.test == XQueryRelation::Equal) {
+    if (isDistinct) keepDistinct(probes);
+  } else if (!probes.empty())
+    probes.assign(1, decidingProbe(relation, probes));
 }
 
 // In the order of the items, each once; an item that has to be asked stays one.
@@ -216,7 +218,8 @@ XQueryJoinTable::Way XQueryJoinTable::wayFor(const Value& probe, Operands& probe
   return wayOfNumbers(probes);
 }
 
-std::optional<XQueryJoinTable::Question> XQueryJoinTable::questionOf(const Value& probe) {
+std::optional<XQueryJoinTable::Question> XQueryJoinTable::questionOf(const Value& probe,
+                                                                     bool isDistinct) {
   Question question;
   question.way = wayFor(probe, question.operands);
   if (question.way == Way::Plain) return std::nullopt;
@@ -228,7 +231,7 @@ std::optional<XQueryJoinTable::Question> XQueryJoinTable::questionOf(const Value
     case Way::Texts:
       readTexts();
       for (const Operand& each : question.operands) question.texts.push_back(each.text.view());
-      keepDeciding(_relation, question.texts);
+      keepDeciding(_relation, isDistinct, question.texts);
       break;
     case Way::Numbers:
     case Way::NumbersButTies:
@@ -238,7 +241,7 @@ std::optional<XQueryJoinTable::Question> XQueryJoinTable::questionOf(const Value
         // NaN meets nothing.
         if (!std::isnan(each.number)) question.numbers.push_back(each.number);
       }
-      keepDeciding(_relation, question.numbers);
+      keepDeciding(_relation, isDistinct, question.numbers);
       break;
     case Way::Exacts:
       readExacts();
@@ -246,7 +249,7 @@ std::optional<XQueryJoinTable::Question> XQueryJoinTable::questionOf(const Value
         const auto* number = cast<NSNumber>(XQueryItemList(probe.get())[index]);
         question.exacts.push_back({question.operands[index].number, number});
       }
-      keepDeciding(_relation, question.exacts);
+      keepDeciding(_relation, isDistinct, question.exacts);
       break;
     default:
       break;
@@ -281,7 +284,8 @@ void XQueryJoinTable::select(const Question& question, Selection& selection, boo
 
 std::optional<bool> XQueryJoinTable::meets(const Value& probe) {
   if (!_irregular.empty()) return std::nullopt;
-  const auto question = questionOf(probe);
+  // The first one that is found decides, so that sorting them would take longer.
+  const auto question = questionOf(probe, false);
   if (!question || (isOfNumbers(*question) && !_irregularAsNumbers.empty())) return std::nullopt;
   bool areMet = false;
   bool isOpen = false;

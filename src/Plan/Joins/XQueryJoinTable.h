@@ -83,7 +83,8 @@ class XQueryJoinTable final : public XQueryKeptValue {
   // Not for several threads at once: the table is completed by what it is asked.
   //
   // Nothing for a probe, null for one that could not be had, that has to be compared the plain way.
-  std::optional<Question> questionOf(const Value& probe);
+  // Unless `isDistinct`, a key may be found twice.
+  std::optional<Question> questionOf(const Value& probe, bool isDistinct = true);
   // About how many items it will select.
   size_t estimateFor(const Question& question);
   // Puts the items that meet the comparison with the probe, and those that have to be asked, into

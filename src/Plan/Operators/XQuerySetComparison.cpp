@@ -22,6 +22,7 @@ namespace {
 
 // So few are compared as quickly as looked up.
 constexpr size_t fewPairs = 8;
+constexpr size_t fewItems = 64;
 // A set that is used but once is worth its making.
 constexpr size_t manyPairs = size_t{1} << 14;
 
@@ -35,12 +36,13 @@ XQueryJoinRelation relationOf(int type, bool setIsLeft) {
 
 }  // namespace
 
-Ref<XQuerySetComparison> XQuerySetComparison::exprWithPlain(Ref<XQueryOperatorExpr> plain) {
-  return make<XQuerySetComparison>(std::move(plain));
+Ref<XQuerySetComparison> XQuerySetComparison::exprWithPlain(Ref<XQueryOperatorExpr> plain,
+                                                            Again again) {
+  return make<XQuerySetComparison>(std::move(plain), again);
 }
 
-XQuerySetComparison::XQuerySetComparison(Ref<XQueryOperatorExpr> plain)
-    : XQueryPlannedExpr(plain), _comparison(*plain) {}
+XQuerySetComparison::XQuerySetComparison(Ref<XQueryOperatorExpr> plain, Again again)
+    : XQueryPlannedExpr(plain), _comparison(*plain), _again(again) {}
 
 Value XQuerySetComparison::computeValue(XQueryContext& context) const {
   const Value left = _comparison.left()->evaluateWithContext(context);
@@ -53,7 +55,11 @@ Value XQuerySetComparison::computeValue(XQueryContext& context) const {
   const size_t work = pairs ? pairs : leftCount + rightCount;
   if (work <= fewPairs || _internal(context).showsErrors())
     return _comparison.answerFor(left, right, context);
-  const bool setIsLeft = leftCount > rightCount;
+  bool setIsLeft = leftCount > rightCount;
+  // However long a list is that is never seen again, looking its items up takes less than a set of
+  // them, which could answer no other comparison.
+  if (_again == Again::Left && leftCount >= fewItems) setIsLeft = true;
+  if (_again == Again::Right && rightCount >= fewItems) setIsLeft = false;
   const auto set = setOf(setIsLeft ? left : right, setIsLeft, work >= manyPairs, context);
   if (pairs == 0 && left && right && set && set->isRegular()) return NSNull::null();
   const auto areMet = set ? set->meets(setIsLeft ? right : left) : std::nullopt;

@@ -4,6 +4,7 @@
 #include "Plan/Joins/XQueryJoinTable.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
 
+#include <cstdint>
 #include <memory>
 
 namespace xquery {
@@ -12,14 +13,18 @@ class XQueryOperatorExpr;
 
 class XQuerySetComparison : public XQueryPlannedExpr {
  public:
-  [[nodiscard]] static Ref<XQuerySetComparison> exprWithPlain(Ref<XQueryOperatorExpr> plain);
+  // Which sides may be a list that comes again.
+  enum class Again : uint8_t { None, Left, Right, Both };
+  [[nodiscard]] static Ref<XQuerySetComparison> exprWithPlain(Ref<XQueryOperatorExpr> plain,
+                                                              Again again);
 
-  // Of few pairs each is compared; of many, the items of the longer side are put into a set by
-  // their values, which is kept for the next comparison with the same list.
+  // Of few pairs each is compared; of many, the items of one side are put into a set by their
+  // values, which is kept for the next comparison with the same list: of the side that comes again,
+  // or else of the longer one.
   Value computeValue(XQueryContext& context) const override;
 
  protected:
-  explicit XQuerySetComparison(Ref<XQueryOperatorExpr> plain);
+  XQuerySetComparison(Ref<XQueryOperatorExpr> plain, Again again);
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
@@ -28,6 +33,7 @@ class XQuerySetComparison : public XQueryPlannedExpr {
                                          XQueryContext& context) const;
 
   const XQueryOperatorExpr& _comparison;
+  const Again _again;
 };
 
 }  // namespace xquery

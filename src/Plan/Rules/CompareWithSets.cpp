@@ -5,7 +5,8 @@
 // Facts       how many items the sides may have
 // Refused     a literal on one side; the integers of a range; "!="
 // Operator    XQuerySetComparison: evaluates both sides, and where there are many pairs looks the
-//             items of the shorter side up in a set of the longer one
+//             items of one side up in a set of the other one: the one that comes again, or else the
+//             longer one
 // Why         see there
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLeaves.h"
@@ -45,10 +46,14 @@ void XQueryCompareWithSets(XQueryPlanning& planning) {
     if (right == XQueryNoPlace || XQueryOperatorExpr::rangeIn(comparison->right())) continue;
     if (isLiteral(planning, left) || isLiteral(planning, right)) continue;
     const bool areMany = isMany(planning, left) && isMany(planning, right);
-    const bool isSet = (isMany(planning, left) && comesAgain(planning, left)) ||
-                       (isMany(planning, right) && comesAgain(planning, right));
-    if (!areMany && !isSet) continue;
-    planning.wrap(place, XQuerySetComparison::exprWithPlain(Ref<XQueryOperatorExpr>(comparison)));
+    const bool isLeftAgain = isMany(planning, left) && comesAgain(planning, left);
+    const bool isRightAgain = isMany(planning, right) && comesAgain(planning, right);
+    if (!areMany && !isLeftAgain && !isRightAgain) continue;
+    using Again = XQuerySetComparison::Again;
+    const Again ofLeft = isRightAgain ? Again::Both : Again::Left;
+    const Again ofRight = isRightAgain ? Again::Right : Again::None;
+    planning.wrap(place, XQuerySetComparison::exprWithPlain(Ref<XQueryOperatorExpr>(comparison),
+                                                            isLeftAgain ? ofLeft : ofRight));
   }
 }
 
