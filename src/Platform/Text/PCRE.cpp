@@ -13,6 +13,7 @@
 #include "Platform/Base/ThreadClock.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Text/PCREClassicSyntax.h"
+#include "Platform/Text/PlainPattern.h"
 #include "Platform/Text/UTF8.h"
 
 #include <pcre2.h>
@@ -233,6 +234,10 @@ struct PCREPattern::Code {
   bool backReferences = false;
   bool used = false;
   bool translated = false;
+  std::optional<PlainPattern> plain;
+  // Those of a search that is over, of the usual room, for the next one.
+  Owned<pcre2_match_data> idleData;
+  Owned<pcre2_match_context> idleContext;
 
   template <class T>
   T info(uint32_t what) const {
@@ -271,6 +276,9 @@ std::unique_ptr<PCREPattern> PCREPattern::compile(std::string_view pattern, uint
   code->callouts = compiler.callouts();
   code->bytewise = code->info<uint32_t>(PCRE2_INFO_HASBACKSLASHC) != 0;
   code->backReferences = code->info<uint32_t>(PCRE2_INFO_BACKREFMAX) != 0;
+  constexpr uint32_t harmless = PCREMultiline | PCREDotAll | PCREDollarEndOnly | PCREUTF8 |
+                                PCRENoAutoCapture | PCRENoUTF8Check;
+  if ((options & ~harmless) == 0 && (options & PCREUTF8)) code->plain = PlainPattern::of(pattern);
   return std::make_unique<PCREPattern>(std::move(code));
 }
 
@@ -285,8 +293,25 @@ struct PCRESearch::State {
         matchable(!pattern.bytewise || isASCII(subject)),
         allowance(subject.size(), pattern.backReferences),
         unitsPerCallout(pattern.backReferences ? unitsPerBackReference : 1),
-        data(required(pcre2_match_data_create(static_cast<uint32_t>(room), nullptr))),
-        context(required(pcre2_match_context_create(nullptr))) {
+        groupRoom(room) {}
+  ~State() {
+    if (groupRoom != PCRESearch::usualRoom || !data) return;
+    pattern.idleData = std::move(data);
+    pattern.idleContext = std::move(context);
+  }
+
+  // What the library needs, and a plain pattern does not.
+  void prepare() {
+    if (data) return;
+    pattern.translateFor(subject.size());
+    if (groupRoom == PCRESearch::usualRoom && pattern.idleData) {
+      data = std::move(pattern.idleData);
+      context = std::move(pattern.idleContext);
+    } else {
+      data.reset(required(pcre2_match_data_create(static_cast<uint32_t>(groupRoom), nullptr)));
+      context.reset(required(pcre2_match_context_create(nullptr)));
+    }
+    pcre2_jit_stack_assign(context.get(), nullptr, nullptr);
     const auto few = static_cast<uint32_t>(static_cast<size_t>(mostUnits) / (subject.size() + 1));
     pcre2_set_match_limit(context.get(),
                           pattern.callouts ? matchLimit : std::max(few, fewestMatches));
@@ -314,7 +339,22 @@ struct PCRESearch::State {
     }
   }
 
+  // As the library; it fails no more often than it, whose cost of a match is as much.
+  PCRESearch::Outcome findPlain(size_t from) {
+    const auto found = pattern.plain->find(subject, from);
+    const size_t end = found ? found->end : subject.size();
+    if (!allowance.spend(unitsPerSearch + unitsOf(end - from))) return PCRESearch::Outcome::Failed;
+    plainMatch = found ? PCRERange{found->start, found->end} : PCRERange();
+    groups = found ? 1 : 0;
+    return found ? PCRESearch::Outcome::Found : PCRESearch::Outcome::NotFound;
+  }
+  static int64_t unitsOf(size_t bytesMoved) {
+    return static_cast<int64_t>(bytesMoved / (8 * bytesPerUnit));
+  }
+
   int match(size_t from, uint32_t options) {
+    prepare();
+    plainMatch.reset();
     position = from;
     return pcre2_match(pattern.code.get(), bytes(subject), subject.size(), from, options,
                        data.get(), context.get());
@@ -330,6 +370,8 @@ struct PCRESearch::State {
   const bool matchable;
   Allowance allowance;
   const int64_t unitsPerCallout;
+  const size_t groupRoom;
+  std::optional<PCRERange> plainMatch;  // none where the library has searched
   size_t position = 0;
   std::exception_ptr interruption;
   Owned<pcre2_match_data> data;
@@ -339,15 +381,14 @@ struct PCRESearch::State {
 };
 
 PCRESearch::PCRESearch(PCREPattern& pattern, std::string_view subject, size_t room)
-    : _state(std::make_unique<State>(*pattern._code, subject, room)) {
-  pattern._code->translateFor(subject.size());
-}
+    : _state(std::make_unique<State>(*pattern._code, subject, room)) {}
 
 PCRESearch::~PCRESearch() = default;
 
 PCRESearch::Outcome PCRESearch::find(size_t from, uint32_t options) {
   State& state = *_state;
   if (!state.matchable || from > state.subject.size()) return Outcome::Failed;
+  if (state.pattern.plain && options == PCRENoUTF8Check) return state.findPlain(from);
   const uint32_t current = mapped(options, matchOptions);
   int count = state.match(from, current);
   // The machine's stack does for most matches.
@@ -360,12 +401,12 @@ PCRESearch::Outcome PCRESearch::find(size_t from, uint32_t options) {
   state.groups = static_cast<size_t>(std::max(count, 0));
   const size_t reached = count < 0 ? state.subject.size() : group(0).end;
   const size_t moved = reached > from ? reached - from : 0;
-  const auto units = unitsPerSearch + static_cast<int64_t>(moved / (8 * bytesPerUnit));
-  if (!state.allowance.spend(units)) return Outcome::Failed;
+  if (!state.allowance.spend(unitsPerSearch + State::unitsOf(moved))) return Outcome::Failed;
   return count < 0 ? Outcome::NotFound : Outcome::Found;
 }
 
 PCRERange PCRESearch::group(size_t number) const {
+  if (_state->plainMatch) return number == 0 ? *_state->plainMatch : PCRERange();
   // The library does not write to the room of groups that the pattern does not have.
   const size_t known =
       _state->groups > 0 ? _state->groups : pcre2_get_ovector_count(_state->data.get());
