@@ -407,6 +407,23 @@ TEST(Counting, TakesNumbersFromTheIndex) {
   }
 }
 
+// A predicate that asks for a number of nodes keeps all or none.
+TEST(Counting, NodesOfWhichThereHaveToBeSome) {
+  for (const char* condition :
+       {"last() > 1", "last() >= 2", "1 < last()", "2 le last()", "last() gt 1", "last() > 0",
+        "last() > -1", "last() > 1.5", "last() = 2", "last() < 2", "last() > @n", "last() > 'x'",
+        "last() != 1", "last() > 1 and @n", "(last()) > (1)"}) {
+    for (const char* nodes : {"p[#]", "q[#]", "following-sibling::i[#]", "$x/p[#]", "p/text()[#]",
+                              "self::i[#]", "p[#]/..", "@*[#]", "ancestor::*[#]"}) {
+      std::string text(nodes);
+      text.replace(text.find('#'), 1, condition);
+      sameBothWays("//i[" + text + "]/@n", items());
+      sameBothWays("for $x in //i return (exists(" + text + "), count($x[" + text + "]))", items());
+      sameBothWays("//i[not(" + text + ") or q = 'x']/@n", items());
+    }
+  }
+}
+
 TEST(Counting, SumsOfAConstant) {
   for (const char* text : {
            "sum(for $i in //i where $i/@k < $x return 1)",

@@ -16,14 +16,15 @@ std::string ProgramGenerator::predicate(int depth) {
     case 0:
       return "[" +
              _random.oneOf({"1", "2", "last()", "last() - 1", "position() = last()",
-                            "position() < 3", "position() = 1"}) +
+                            "position() < 3", "position() = 1", "last() > 1"}) +
              "]";
     case 1:
       return "[" +
              _random.oneOf({"@x", "b", "c/a", "not(@y)", "b and @x", "not(a or @y = 1)",
                             "ancestor::b", "not(. = 'u') and c", "exists(b[. = 2])",
                             "not(preceding-sibling::a)", "following-sibling::b or @x",
-                            "preceding-sibling::b = 'u'", "empty(following-sibling::node())"}) +
+                            "b[last() > 1]", "preceding-sibling::b = 'u'",
+                            "empty(following-sibling::node())"}) +
              "]";
     case 2:
       return "[" + nameCondition() + "]";

@@ -5,6 +5,7 @@
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Plan/Paths/XQueryWalkedPath.h"
+#include "Plan/Rules/PositionConditions.h"
 
 namespace xquery {
 
@@ -50,8 +51,9 @@ uint64_t XQueryShortWalk::readFromWithPosition(const XQueryPathExpr& path) {
   }
   const auto* only = dyn_cast<XQueryAxisStep>(step);
   if (!only || only->next() || only->predicates().size() != 1) return 0;
-  const auto position = only->literalPosition(0);
-  return position && readOrigin(origin) && readStep(*only) ? *position : 0;
+  auto least = only->literalPosition(0);
+  if (!least) least = XQueryItemsAskedFor(*only->predicates().front());
+  return least && readOrigin(origin) && readStep(*only) ? *least : 0;
 }
 
 bool XQueryShortWalk::readStep(const XQueryAxisStep& step) {

@@ -30,8 +30,9 @@ class XQueryShortWalk {
   // expression. Lives no longer than that expression.
   [[nodiscard]] bool readFrom(const XQueryExpr& expr);
 
-  // The same of a path of one step with a literal position and nothing else, "b[6]", without that:
-  // from one node the path finds something when the walk finds so many. 0 for any other path.
+  // The same of a path of one step with a literal position and nothing else, "b[6]", or a number of
+  // nodes that there have to be, "b[last() > 5]", without that: from one node the path finds
+  // something when the walk finds so many. 0 for any other path.
   [[nodiscard]] uint64_t readFromWithPosition(const XQueryPathExpr& path);
 
   // Whether it starts from the context item.

@@ -11,7 +11,7 @@
 //             Of these only nodes are asked for their truth. They are evaluated to the end unless
 //             they can be repeated, cannot fail but in what the first clause walks, and leave
 //             nothing in variables that can be told. "b[6]", where its truth is asked for, is
-//             whether there are six
+//             whether there are six, and "b[last() > 5]" as well
 // Operator    XQueryPathCount, XQueryItemCount: no list is made, and a walk ends as soon as the
 //             answer is certain. What a join picks for certain is not even listed where it is one
 //             item each (XQueryFLWORExpr::Yield)

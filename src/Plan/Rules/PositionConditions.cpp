@@ -84,4 +84,25 @@ std::optional<uint64_t> XQueryItemsBehindAskedFor(const XQueryExpr& predicate) {
   return XQueryIsPosition(comparison->right()) ? takenFromLast(comparison->left()) : std::nullopt;
 }
 
+std::optional<uint64_t> XQueryItemsAskedFor(const XQueryExpr& predicate) {
+  const auto* comparison = dyn_cast<XQueryOperatorExpr>(XQueryWithoutParentheses(&predicate));
+  if (!comparison) return std::nullopt;
+  const bool isOnLeft = isCallWithoutArguments(comparison->left(), fn_last);
+  if (!isOnLeft && !isCallWithoutArguments(comparison->right(), fn_last)) return std::nullopt;
+  const auto number = XQuerySmallIntegerIn(isOnLeft ? comparison->right() : comparison->left());
+  if (!number || *number < 1) return std::nullopt;
+  const auto least = static_cast<uint64_t>(*number);
+  const int type = comparison->operatorType();
+  switch (isOnLeft ? type : XQueryMirroredComparison(type)) {
+    case XQueryOperatorGreater:
+    case XQueryOperatorGt:
+      return least + 1;
+    case XQueryOperatorGreaterEqual:
+    case XQueryOperatorGe:
+      return least;
+    default:
+      return std::nullopt;
+  }
+}
+
 }  // namespace xquery

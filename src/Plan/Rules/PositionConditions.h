@@ -28,4 +28,8 @@ std::optional<XQueryPositionCondition> XQueryPositionConditionIn(const XQueryExp
 // one that is asked for.
 std::optional<uint64_t> XQueryItemsBehindAskedFor(const XQueryExpr& predicate);
 
+// "last() > 1", "2 <= last()" as a predicate, which keeps all items or none: how many there have to
+// be.
+std::optional<uint64_t> XQueryItemsAskedFor(const XQueryExpr& predicate);
+
 }  // namespace xquery
