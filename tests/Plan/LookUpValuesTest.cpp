@@ -131,7 +131,13 @@ TEST(LookUpValues, LeavesOtherStepsAlone) {
                            "/r/e[@id = 'e7'][1]",
                            "/r/e[@id = 'e7' or s]",
                            "/r/e[*/@x = 'a']",
-                           "/r/e[k/text() = 'k1']",
+                           "/r/e[.//text() = 'k1']",
+                           "/r/*[text() = 'k1']",
+                           "//@id[text() = 'e7']",
+                           "/r/e[k/node() = 'k1']",
+                           "/r/e[k/text()/.. = 'k1']",
+                           "/r/e[k/self::text() = 'k1']",
+                           "/r/e[string(k/text()) = 'k1']",
                            "/r/e[../@id = 'e7']",
                            "/r/e[@id = @n]",
                            "/r/e[@id = position()]",
@@ -189,6 +195,22 @@ TEST(LookUpValues, TakesWhatIsFurtherDown) {
         "for $e in /r/e where $e//k = 'k3' return $e/@id", "//e[exists(.//b[. = '1'])]/@id"}) {
     EXPECT_GE(lookupsIn(text), 1U) << text;
     resultOf(text);
+  }
+}
+
+// Those of mixed content as well, which are only a part of an element's value.
+TEST(LookUpValues, TakesTexts) {
+  for (const char* text :
+       {"/r/e[k/text() = 'k1']/@id", "//k[text() = 'k']/..", "/r/e[k[text() = 'k1']]/@id",
+        "//*[k/text() = 'k']/@id", "/r/e[some $k in k/text() satisfies $k = 'k']/@id",
+        "/r/e[exists(k/text()[. = '0'])]/@id", "/r/e[e/k/b/text() eq '1']",
+        "/r/e[.//k/text() = 'k10']/@id", "//k[child::text() = '0']",
+        "for $e in /r/e where $e/k/text() = 'k' return $e/@id",
+        "for $e in /r/e let $t := $e/v/text() where $t = '3.0' return $e/@id",
+        "//e[data(k/text()) = 'k1']/@id", "(/r/e, /r)[1]/../e[k/text() = '']"}) {
+    EXPECT_GE(lookupsIn(text), 1U) << text;
+    resultOf(text);
+    resultOf("count(" + std::string(text) + ")");
   }
 }
 
@@ -256,6 +278,34 @@ TEST(LookUpValues, TakesConditionsOfDeclaredFunctions) {
     EXPECT_EQ(lookupsIn(declarations + text), ofTheirOwn) << text;
     if (std::string_view(text).find("loop") == std::string_view::npos)
       resultOf(declarations + text);
+  }
+}
+
+TEST(LookUpValues, TakesAnEarlierClauseBehindWhichNothingCanBeTold) {
+  for (const char* text : {
+           "for $e in /r/e, $k in $e/k where $e/@id = 'e7' return $k",
+           "for $e in /r/e, $k in $e/k where $e/@n = '3' and $k = 'k3' return $k",
+           "for $e in /r/e, $k at $n in $e/k where $e/@n = '3' return ($n, $k)",
+           "for $e in /r/e let $i := $e/@id for $k in $e/k, $s in $e/s where $i = 'e7' return $s",
+           "for $e in /r/e let $i := string($e/@id) for $k in $e/k where $i = 'e7' return $k",
+           "for $e in /r/e, $k in $e/k where $e/@n = '3' and error() return $k",
+           "for $e in /r/e, $k in $e/k where $e/@n = '3' order by $k return $k",
+       }) {
+    EXPECT_EQ(lookupsIn(text), 1U) << text;
+    resultOf(text);
+  }
+  for (const char* text : {
+           "for $e in /r/e, $k in xs:integer($e/@n) where $e/@id = 'e7' return $k",
+           "for $e in /r/e, $k as element() in $e/k where $e/@id = 'e7' return $k",
+           "for $e in /r/e, $k in <a>{$e/k}</a> where $e/@id = 'e7' return $k",
+           "for $e in /r/e, $k in doc(string($e/k[1])) where $e/@id = 'e7' return $k",
+           "for $e in /r/e, $k in $e/k where $k and $e/@id = 'e7' return $k",
+           "for $e in /r/e, $k in $e/k where $e/@id = $k return $k",
+           "for $e in /r/e, $k in $e/k let $i := string($k/@id) where $i = 'e7' return $k",
+           "for $e at $n in /r/e, $k in $e/k where $e/@id = 'e7' return $n",
+       }) {
+    EXPECT_EQ(lookupsIn(text), 0U) << text;
+    resultOf(text);
   }
 }
 
@@ -390,8 +440,8 @@ TEST(LookUpValues, SeeATreeAsItIsAfterAChange) {
 
 TEST(LookUpValues, AgreeWithWalkingOverGeneratedQueries) {
   RandomChoices random(20041029);
-  const std::vector<std::string> keys = {"@id", "@n",  "k", "e/@id", "s/@x",
-                                         "k/b", "e/k", ".", "./k",   "e//k"};
+  const std::vector<std::string> keys = {"@id", "@n", "k",   "e/@id", "s/@x",     "k/b",
+                                         "e/k", ".",  "./k", "e//k",  "k/text()", "text()"};
   const std::vector<std::string> probes = {"'e3'",
                                            "'3'",
                                            "'k3'",

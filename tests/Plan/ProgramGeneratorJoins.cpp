@@ -229,7 +229,8 @@ std::string ProgramGenerator::positions() {
 }
 
 std::string ProgramGenerator::lookedUp(int depth) {
-  const std::string key = _random.oneOf({"@x", "@x", "c", ".", "b/@x", ".//c", "@*", "./c"});
+  const std::string key =
+      _random.oneOf({"@x", "@x", "c", ".", "b/@x", ".//c", "@*", "./c", "c/text()", "text()"});
   const std::string probe =
       _random.oneOf({"'1'", "'u'", "''", "'2.5'", "1", "$o", "string($o)", operand(1)});
   const std::string equals = _random.oneOf({" = ", " = ", " eq ", " != "}) + probe;

@@ -18,6 +18,7 @@ using Of = XQueryValueLookup::Of;
 
 // A walk among fewer elements is as quick.
 constexpr size_t fewElements = 64;
+constexpr size_t fewProbes = 64;
 
 struct Range {
   const NSXMLNode* first;
@@ -123,11 +124,18 @@ void XQueryValueLookup::addNodesWith(const NSXMLValueIndex& values, const XQuery
                                      const NSXMLNode* first, const NSXMLNode* stop,
                                      XQueryStepTest& test,
                                      std::vector<NSXMLNode*>& candidates) const {
+  // What several have for their value is listed once, where they are many.
+  std::vector<bool> areListed(probes.count() > fewProbes ? values.valueCount() : 0);
   WorkPacer pacer;
   for (size_t index = 0; index < probes.count(); ++index) {
     pacer.turn();
     const XQueryJoinOperand probe(probes[index]);
-    const auto found = NSXMLNameIndex::between(values.nodes(probe.text.view()), first, stop);
+    const uint32_t number = values.numberOf(probe.text.view());
+    if (number < areListed.size()) {
+      if (areListed[number]) continue;
+      areListed[number] = true;
+    }
+    const auto found = NSXMLNameIndex::between(values.nodes(number), first, stop);
     if (_of == Of::Attribute) {
       listAttributes(found, candidates);
     } else if (_of == Of::AnyName) {

@@ -1,6 +1,7 @@
 #include "Plan/Paths/XQueryValueWay.h"
 
 #include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Plan/Paths/XQueryWalkedStep.h"
 #include "Platform/Tree/Names.h"
 
@@ -8,11 +9,21 @@
 
 namespace xquery {
 
+namespace {
+
+bool isToTexts(const XQueryAxisStep& step) {
+  const auto* type = dyn_cast<XQueryTypeDeclaration>(step.expr());
+  return step.axis() == XQueryAxisChild && type && type->acceptsCount(1) && !type->data() &&
+         type->type() == XQueryTypeDeclaration::TextTest;
+}
+
+}  // namespace
+
 bool XQueryValueWay::addSteps(const XQueryStep* first, const XQueryStep* end) {
   bool isBelow = false;
   for (const XQueryStep* step = first; step != end; step = step->next()) {
     const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
-    if (!axisStep || _attribute) return false;
+    if (!axisStep || _attribute || _endsInTexts) return false;
     if (XQueryWalkedStep(*axisStep).isDescendantShorthand()) {
       isBelow = true;
     } else if (addStep(*axisStep, isBelow)) {
@@ -25,6 +36,10 @@ bool XQueryValueWay::addSteps(const XQueryStep* first, const XQueryStep* end) {
 }
 
 bool XQueryValueWay::addStep(const XQueryAxisStep& step, bool isBelow) {
+  if (isToTexts(step) && !isBelow) {
+    _endsInTexts = true;
+    return true;
+  }
   const auto* test = dyn_cast<XQueryNameTest>(step.expr());
   const NSXMLExpandedName* name = test ? nameOf(*test) : nullptr;
   if (!name || _steps.size() == mostSteps) return false;
@@ -49,11 +64,12 @@ bool XQueryValueWay::isOfChildren() const {
 }
 
 NSXMLValueKey XQueryValueWay::keyFor(const NSXMLExpandedName& element) const {
-  return {NSXMLExpandedNameRef(&element), _steps, _attribute};
+  return {NSXMLExpandedNameRef(&element), _steps, _attribute, _endsInTexts};
 }
 
 NSXMLValueKey XQueryValueWay::keyOfEnd() const {
-  return {_steps.empty() ? NSXMLExpandedNameRef() : _steps.back().name, {}, _attribute};
+  const auto name = _steps.empty() ? NSXMLExpandedNameRef() : _steps.back().name;
+  return {name, {}, _attribute, _endsInTexts};
 }
 
 NSXMLNode* XQueryValueWay::start(NSXMLNode* end) const {

@@ -1,5 +1,5 @@
 // The way from a node to values that belong to it, by names: over children and descendants, and
-// perhaps to an attribute in the end. "@id", "author/last", ".//emph".
+// perhaps to an attribute or texts in the end. "@id", "author/last", ".//emph", "title/text()".
 #pragma once
 
 #include "Context/XQueryContextInternal.h"
@@ -21,10 +21,10 @@ class XQueryValueWay {
   static constexpr size_t mostSteps = 8;
 
   // Goes on along the steps from the first one up to `end`, which is null for all of them, whatever
-  // their predicates are. False, and the way is of no use, for others than to names.
+  // their predicates are. False, and the way is of no use, for others than to names and texts.
   [[nodiscard]] bool addSteps(const XQueryStep* first, const XQueryStep* end);
   // Whether it leads to the node itself.
-  bool isEmpty() const { return _steps.empty() && !_attribute; }
+  bool isEmpty() const { return _steps.empty() && !_attribute && !_endsInTexts; }
   // Whether it leads to children and their attributes alone.
   bool isOfChildren() const;
 
@@ -34,8 +34,9 @@ class XQueryValueWay {
   }
   // The key by which an index finds the elements of the name from which the way leads to a value.
   NSXMLValueKey keyFor(const NSXMLExpandedName& element) const;
-  // The key of what has the value: the elements that the way leads to, or those that have the
-  // attribute. For a way of children, which is not empty.
+  // Whether there is a key of what has the value: the elements that the way leads to, or those that
+  // have the attribute.
+  bool hasKeyOfEnd() const { return isOfChildren() && (!_steps.empty() || _attribute); }
   NSXMLValueKey keyOfEnd() const;
   // From such an element up to the node where the way begins; null where it is another way.
   NSXMLNode* start(NSXMLNode* end) const;
@@ -46,6 +47,7 @@ class XQueryValueWay {
 
   std::vector<NSXMLValueStep> _steps;
   NSXMLExpandedNameRef _attribute;
+  bool _endsInTexts = false;
   bool _needsNoDefaultNamespace = false;
 };
 

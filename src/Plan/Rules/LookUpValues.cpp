@@ -3,12 +3,12 @@
 // Pattern     a step child::name, child::*, descendant::name or //@name, also behind "//", with a
 //             predicate that holds only for what has a certain value (ValueConditions.h); such a
 //             step as the last one of P in "(P)[C]", where C is such a condition, and in "for $x in
-//             P let ... where C"
+//             P ... where C"
 // Facts       of the step: all predicates ask for truth, whatever place a node has, and can be
 //             repeated with all steps behind; of the value that is asked for: it is repeatable and
 //             does not read the focus, but for the root in a predicate, or where the path begins
 //             at it; of a clause: it has neither position nor type, what is left in its variable
-//             cannot be told, and let clauses behind it cannot fail
+//             cannot be told, and clauses behind it can be repeated and cannot fail
 // Operator    none: the step is told by which key its nodes are found (XQueryValueLookup)
 // Why         untyped values are compared with texts by their texts, and equal texts are what the
 //             index answers; its candidates are asked the condition as before, unless it says no
@@ -30,6 +30,7 @@
 #include <memory>
 #include <optional>
 #include <utility>
+#include <vector>
 
 namespace xquery {
 namespace {
@@ -79,41 +80,58 @@ class Search {
     if (takeCondition(predicates.front(), {}, *path, last)) _planning.choose(place);
   }
 
-  // The last "for" before the where clause, behind which there is nothing but "let".
+  // A "for" before the where clause, the last one or one behind which nobody can tell that clauses
+  // are not evaluated.
   void takeClause(XQueryPlaceID place) {
     const XQueryPlaceID where = _program.part(place, XQueryRole::Where);
-    if (where == XQueryNoPlace) return;
-    XQueryPlaceID last = XQueryNoPlace;
-    XQueryValueOrigin origin;
-    XQueryVariableSet leftovers = _planning.facts[where].assigns;
-    bool areIdle = true;
+    if (where == XQueryNoPlace || !isIdleButForErrors(firstConditionOf(where))) return;
+    std::vector<XQueryPlaceID> clauses;
     for (XQueryPlaceID part = _program.firstPart(place); part != where;
          part = _program.nextPart(part)) {
-      if (isa<XQueryForExpr>(_program[part].expr)) {
-        last = part;
-        origin.own = {};
-        areIdle = true;
-      } else {
-        areIdle = areIdle && addLet(part, origin);
-      }
+      clauses.push_back(part);
     }
-    const auto* clause = last == XQueryNoPlace ? nullptr : cast<XQueryForExpr>(_program[last].expr);
-    if (!areIdle || !clause || clause->type() || clause->posVarID() != 0 || clause->varID() == 0) {
-      return;
+    XQueryValueOrigin origin;
+    while (!clauses.empty()) {
+      const XQueryPlaceID clause = clauses.back();
+      clauses.pop_back();
+      if (isa<XQueryForExpr>(_program[clause].expr) && takeClause(clause, where, origin)) return;
+      if (!addLater(clause, origin)) return;
     }
-    XQueryWalkedPath* path = wholePathAt(_program.part(last, XQueryRole::Bound));
-    if (!path || !isIdleButForErrors(firstConditionOf(where))) return;
-    origin.varID = clause->varID();
+  }
+
+  // `origin` has the variables that are set behind the clause.
+  bool takeClause(XQueryPlaceID place, XQueryPlaceID where, XQueryValueOrigin origin) {
+    const auto& clause = *cast<XQueryForExpr>(_program[place].expr);
+    if (clause.type() || clause.posVarID() != 0 || clause.varID() == 0) return false;
+    XQueryWalkedPath* path = wholePathAt(_program.part(place, XQueryRole::Bound));
+    if (!path) return false;
+    origin.varID = clause.varID();
     origin.errorExcludes = false;
     origin.isInTreeOfFocus = path->start() && isa<XQueryRootStep>(path->start());
+    XQueryVariableSet leftovers = _planning.facts[where].assigns;
     leftovers.add(origin.own);
-    leftovers.add(clause->varID());
+    leftovers.add(clause.varID());
     XQueryWalkedStep& step = path->changeableSteps().back();
-    if (!conditionFor(where, origin, targetOf(*path, step))) return;
+    if (!conditionFor(where, origin, targetOf(*path, step))) return false;
     if (_planning.showsLeftovers(leftovers, place)) {
-      return _planning.refuse(last, "a variable that would be left with another item may be read");
+      _planning.refuse(place, "a variable that would be left with another item may be read");
+      return false;
     }
-    if (takeCondition(where, origin, *path, step)) _planning.choose(last);
+    if (!takeCondition(where, origin, *path, step)) return false;
+    _planning.choose(place);
+    return true;
+  }
+
+  // A clause that nobody can tell is not evaluated.
+  bool addLater(XQueryPlaceID part, XQueryValueOrigin& origin) const {
+    const auto* forExpr = dyn_cast<XQueryForExpr>(_program[part].expr);
+    if (!forExpr) return addLet(part, origin);
+    const XQueryPlaceID bound = _program.part(part, XQueryRole::Bound);
+    if (forExpr->type() || bound == XQueryNoPlace) return false;
+    origin.own.add(forExpr->varID());
+    origin.own.add(forExpr->posVarID());
+    origin.own.add(_planning.facts[bound].assigns);
+    return isIdleButForErrors(bound) && !_planning.facts[bound].does(XQueryDeeds::MayFail);
   }
 
   // A let clause that nobody can tell is not evaluated.
@@ -181,8 +199,7 @@ class Search {
     if (!found) return std::nullopt;
     const XQueryValueWay& way = found->way;
     const bool fits =
-        target.of == Of::Name ||
-        (target.of == Of::Attribute ? way.isEmpty() : !way.isEmpty() && way.isOfChildren());
+        target.of == Of::Name || (target.of == Of::Attribute ? way.isEmpty() : way.hasKeyOfEnd());
     return fits ? std::move(found) : std::nullopt;
   }
 

@@ -68,12 +68,21 @@ class ValueWalk {
   }
 
   bool visitValues(const NSXMLNode* element) {
+    if (_key.ofTexts) return visitTexts(element);
     const NSXMLExpandedName* const name = _key.attribute.get();
     if (!name) return _visit(element);
     for (const NSXMLNode* attribute = cast<NSXMLElement>(element)->firstAttribute(); attribute;
          attribute = NSXMLElement::nextAttribute(attribute)) {
       _pacer.turn();
       if (attribute->expandedName() == name && !_visit(attribute)) return false;
+    }
+    return true;
+  }
+
+  bool visitTexts(const NSXMLNode* element) {
+    for (const NSXMLNode* child = element->firstChild(); child; child = child->nextSibling()) {
+      _pacer.turn();
+      if (child->kind() == Kind::Text && !_visit(child)) return false;
     }
     return true;
   }
@@ -90,7 +99,8 @@ bool operator==(const NSXMLValueKey& a, const NSXMLValueKey& b) {
   const auto isSame = [](const NSXMLExpandedNameRef& x, const NSXMLExpandedNameRef& y) {
     return x.get() == y.get();
   };
-  return isSame(a.element, b.element) && isSame(a.attribute, b.attribute) && a.steps == b.steps;
+  return isSame(a.element, b.element) && isSame(a.attribute, b.attribute) &&
+         a.ofTexts == b.ofTexts && a.steps == b.steps;
 }
 
 size_t NSXMLValueIndex::placeOf(NSStringView value, uint32_t hash) const {
@@ -203,9 +213,13 @@ std::unique_ptr<const NSXMLValueIndex> NSXMLValueIndex::make(NSXMLNodeSpan eleme
   return maker.index();
 }
 
-NSXMLNodeSpan NSXMLValueIndex::nodes(NSStringView value) const {
+uint32_t NSXMLValueIndex::numberOf(NSStringView value) const {
   const uint32_t number = _table[placeOf(value, value.hash())];
-  if (number == free) return {};
+  return number == free ? static_cast<uint32_t>(_values.size()) : number;
+}
+
+NSXMLNodeSpan NSXMLValueIndex::nodes(uint32_t number) const {
+  if (number >= _values.size()) return {};
   const uint32_t begin = number == 0 ? 0 : _values[number - 1].end;
   return _nodes.span().subspan(begin, _values[number].end - begin);
 }

@@ -4,9 +4,10 @@
 //   for item, seller/@person      <item><seller person="p1"/><seller person="p2"/></item>
 //                                 is found by "p1" and by "p2"
 //
-// A value is the string value of the node that the key leads to; texts are the same when their
-// units are. An element may have several values, one of them twice, or none: it is found once by
-// each. Texts are not copied: a value is known by the first node that has it.
+// A value is the string value of the node that the key leads to, or the text of each of its texts;
+// texts are the same when their units are. An element may have several values, one of them twice,
+// or none: it is found once by each. Texts are not copied: a value is known by the first node that
+// has it.
 //
 // As a name index, it is made in one pass, never changes and is of the tree as it was. Where
 // elements lie in each other, each has the values of all below it: an index that would become much
@@ -41,6 +42,7 @@ struct NSXMLValueKey {
       element;  // null for those of any name that have the attribute, without steps
   std::vector<NSXMLValueStep> steps;  // none: the element
   NSXMLExpandedNameRef attribute;     // of what the steps lead to; null for its own string value
+  bool ofTexts = false;               // its children that are texts, each with its own value
 
   friend bool operator==(const NSXMLValueKey& a, const NSXMLValueKey& b);
 };
@@ -57,7 +59,10 @@ class NSXMLValueIndex {
   // Whether it has been given up: it knows nothing.
   bool isGivenUp() const { return _isGivenUp; }
   // The elements that have the value, in document order.
-  NSXMLNodeSpan nodes(NSStringView value) const;
+  NSXMLNodeSpan nodes(NSStringView value) const { return nodes(numberOf(value)); }
+  // The number of the value, and valueCount() for one that no element has.
+  uint32_t numberOf(NSStringView value) const;
+  NSXMLNodeSpan nodes(uint32_t number) const;
   // How many different values there are.
   size_t valueCount() const { return _values.size(); }
 

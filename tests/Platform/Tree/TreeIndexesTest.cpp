@@ -223,6 +223,15 @@ Nodes valuesOf(NSXMLNode* element, const NSXMLValueKey& key) {
     }
     at.swap(below);
   }
+  if (key.ofTexts) {
+    Nodes texts;
+    for (const NSXMLNode* node : at) {
+      for (NSXMLNode* each = node->firstChild(); each; each = each->nextSibling()) {
+        if (each->kind() == Kind::Text) texts.push_back(each);
+      }
+    }
+    return texts;
+  }
   if (!key.attribute) return at;
   Nodes attributes;
   for (const NSXMLNode* node : at) {
@@ -255,6 +264,9 @@ const NSXMLValueKey someKeys[] = {
     {name("none"), {name("a")}, {}},
     {name("a"), {{name("b"), true}}, name("x")},
     {name("r"), {name("a"), {name("c"), true}}, {}},
+    {name("a"), {}, {}, true},
+    {name("r"), {name("a"), name("b")}, {}, true},
+    {name("a"), {{name("b"), true}}, {}, true},
 };
 
 void expectValues(const NSXMLValueIndex& index, NSXMLNode* root, const NSXMLValueKey& key) {
