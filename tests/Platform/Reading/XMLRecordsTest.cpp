@@ -159,6 +159,7 @@ TEST(XMLRecords, TellTheColumnOfAnErrorAsReadersOfTheWholeDocumentDo) {
   for (const std::string text :
        {"<r><b>x</b><b></r>", "<r><é>a</é><b></r>", "<r><b><漢>a</漢></b><b>ü</b><c></r>",
         "<r>\n<b>é</b><é/><b x='é'></b><é ></é ><!-- </é> --><![CDATA[</é>]]><?p </é>?><b></r>",
+        "<r><b>é</b><!--\n é</é> --><c></r>", "<r><![CDATA[\n</é>\n</é>]]>é<é>é</é\n>é<c></r>",
         "<r>é<b/><漢></漢>é</q></r>", "<r><b>é</b>\n<b>&#x0;</b></r>"}) {
     NSXMLParseError error;
     ASSERT_FALSE(NSXMLDocument::documentWithData(text, NSXMLNodeOptionsNone, &error)) << text;
