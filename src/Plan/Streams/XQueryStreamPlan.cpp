@@ -283,6 +283,10 @@ class Analysis : private XQueryRecordAnalysis {
     const auto number = isPosition ? literalAt(_program.nextPart(left)) : std::nullopt;
     if (!number) return false;
     switch (comparison->operatorType()) {
+      case XQueryOperatorEqual:
+      case XQueryOperatorEq:
+        _now.first = _now.last = *number;
+        return *number > 0;
       case XQueryOperatorLess:
       case XQueryOperatorLt:
         _now.last = *number - std::min<uint64_t>(*number, 1);

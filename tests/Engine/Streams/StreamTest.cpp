@@ -154,6 +154,7 @@ constexpr std::string_view queries[] = {
     "distinct-values(/a/b/c/string())",
     "(/a/b/c)[position() <= 2]",
     "(/a/b/c)[position() < 1]",
+    "(/a/b/c)[position() eq 2]",
     "(/a/b/c)[position() > 1]",
     "let $n := 1 for $b in /a/b where $b/c > $n return $b/c",
     "count(/a/b) + 1",

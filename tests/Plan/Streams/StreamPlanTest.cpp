@@ -94,6 +94,7 @@ TEST(StreamPlan, ClausesAndFoldsStandAroundAPath) {
       {"(/a/b)[position() <= 10]", "part 1-10 /a/b"},
       {"(/a/b)[position() lt 10]", "part 1-9 /a/b"},
       {"(/a/b)[position() < 0]", "part 1-0 /a/b"},
+      {"(/a/b)[position() = 2]", "part 2-2 /a/b"},
       {"(/a/b/c)[position() > 2]", "part 3- /a/b/c"},
       {"(for $b in /a/b return $b/c)[position() ge 2]", "part 2- /a/b"},
       {"let $n := 3 for $b in /a/b where $b/c > $n return $b/d", "items /a/b"},
