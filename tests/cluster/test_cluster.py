@@ -12,6 +12,7 @@ import re
 import subprocess
 import time
 
+import distributed
 import pytest
 import xquery
 from xquery import cluster as xc
@@ -188,6 +189,48 @@ def test_workers_compile_once_and_keep_documents_up_to_a_bound(two_workers, fold
     assert xc.map(two_workers.client, query, paths[:1]).results == [[1]]
 
 
+def test_without_a_cache_no_document_is_kept(two_workers, folder):
+    paths, sums = write_files(folder, 4)
+    paths[0].write_text("")
+
+    def kept():
+        from xquery import cluster
+
+        return len(cluster._documents._known)
+
+    xc.map(two_workers.client, "sum(//income)", paths, batch=1)
+    assert sum(two_workers.client.run(kept).values()) >= 3
+    outcome = xc.map(two_workers.client, "sum(//income)", paths * 4, batch=1, cache=0)
+    assert outcome.results == [None, *([each] for each in sums[1:])] * 4
+    assert set(two_workers.client.run(kept).values()) == {0}
+
+
+def test_inputs_of_tasks_that_somebody_cancels_are_reported(two_workers, folder):
+    paths, sums = write_files(folder, 12)
+    slow = "sum((//income, count(for $i in 1 to 300000 where $i mod 7 = 0 return $i) * 0))"
+
+    def cancel(done, failed):
+        if done == 1:
+            client = two_workers.client
+            client.cancel([distributed.Future(key, client) for key in list(client.futures)])
+
+    outcome = xc.map(two_workers.client, slow, paths, batch=1, progress=cancel)
+    failed = {failure.input for failure in outcome.failures}
+    assert 0 < len(failed) < 12
+    assert {type(failure.error) for failure in outcome.failures} == {distributed.CancelledError}
+    assert outcome.results == [
+        None if str(path) in failed else [each] for path, each in zip(paths, sums)
+    ]
+
+
+def test_what_a_folding_query_fails_with_is_raised(two_workers, folder):
+    paths, _ = write_files(folder, 4)
+    failing = "declare variable $results external; sum($results) idiv 0"
+    for fold in (False, True):
+        with pytest.raises(xquery.Error, match="divide by zero"):
+            xc.map(two_workers.client, "sum(//income)", paths, failing, fold=fold)
+
+
 def test_a_second_query_folds_on_the_workers_too(two_workers, folder):
     paths, sums = write_files(folder, 30)
     outcome = xc.map(two_workers.client, "//income/xs:integer(.)", paths, SUM, fold=True, batch=7)
@@ -266,6 +309,20 @@ def test_pieces_stay_where_they_are_wanted(two_workers, folder):
     outcome = xc.map(two_workers.client, "count(//person)", [records])
     assert sum(items[0] for items in outcome.results) == count
     assert outcome.inputs == sorted(str(path) for path in (folder / "pieces").iterdir())
+
+
+def test_a_piece_that_fails_stays(two_workers, folder):
+    site = folder / "site.xml"
+    persons = "".join(f"<person><age>{'x' if i == 15 else i}</age></person>" for i in range(30))
+    site.write_text(f"<site>{persons}</site>")
+    beside = folder / "beside.xml"
+    beside.write_text("<site/>")
+    records = xc.Records(site, "/site/person", 10, folder / "pieces")
+    outcome = xc.map(two_workers.client, "sum(for $a in //age return xs:integer($a))",
+                     [records, beside])
+    assert [items is None for items in outcome.results] == [False, True, False, False]
+    assert [str(path) for path in (folder / "pieces").iterdir()] == [outcome.failures[0].input]
+    assert beside.exists()
 
 
 def test_a_large_document_that_is_bad_is_reported(two_workers, folder):

@@ -9,7 +9,7 @@ import re
 import shutil
 import subprocess
 import tempfile
-from typing import Dict, Iterator, List, Optional, Union
+from typing import Dict, Iterator, List, Optional, Set, Union
 
 import xquery
 
@@ -26,7 +26,8 @@ class Records:
 
     ``folder`` is where the pieces go: storage that all workers share. It is made where there is
     none, and must be empty. Without it the pieces go to a temporary folder, which is good where all
-    workers are on this machine. A piece is removed when it has been evaluated, unless ``keep``.
+    workers are on this machine. A piece is removed when it has been evaluated, unless ``keep``; one
+    that fails stays in the folder, to be looked at.
 
     ``namespaces`` makes prefixes known to the path. ``command`` is the command to run.
     """
@@ -55,6 +56,7 @@ class Records:
         self.keep = keep
         self.command = command
         self._temporary: Optional[str] = None
+        self._pieces: Set[str] = set()
         self._process: Optional["subprocess.Popen[str]"] = None
 
     def __repr__(self) -> str:
@@ -73,17 +75,19 @@ class Records:
             )
             assert self._process.stdout is not None
             with self._process.stdout as names:
-                for name in names:
-                    yield name.rstrip("\n")
+                for line in names:
+                    name = line.rstrip("\n")
+                    self._pieces.add(name)
+                    yield name
             status = self._process.wait()
             if status != 0:
                 messages.seek(0)
                 raise _error(messages.read(), self.path, status)
 
     def done(self, path: str) -> None:
-        """The piece has been evaluated."""
-        folder = self._temporary or self.folder
-        if not self.keep and folder is not None and os.path.dirname(path) == folder:
+        """Removes a piece that has been evaluated. Of another path nothing is done."""
+        if not self.keep and path in self._pieces:
+            self._pieces.remove(path)
             pathlib.Path(path).unlink(missing_ok=True)
 
     def close(self) -> None:

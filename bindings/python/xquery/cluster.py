@@ -71,7 +71,8 @@ class Failure(NamedTuple):
     #: As it was given; of a piece the path of the piece.
     input: str
     #: ``xquery.Error`` where the document or the query fails, ``OSError`` where it cannot be read,
-    #: ``distributed.KilledWorker`` where every worker is lost that tries.
+    #: ``distributed.KilledWorker`` where every worker is lost that tries, and
+    #: ``distributed.CancelledError`` where somebody else cancels it, as a restart does.
     error: BaseException
 
     @property
@@ -129,12 +130,14 @@ def map(
     ``combine`` is a query with ``declare variable $results external;``, which are the items of all
     results in the order of the inputs, nodes as elements. It is evaluated once, here. With ``fold``
     the workers evaluate it over the results of each batch as well, so that only what that comes to
-    travels; the query must be one that can be asked of its own results, as a sum.
+    travels; the query must be one that can be asked of its own results, as a sum. What it fails
+    with, here or there, is raised.
 
     ``variables`` are for ``query``; what can be pickled. ``batch`` inputs make a task.
 
-    ``cache`` bounds the parsed documents that a worker process keeps, in bytes of their files. What
-    is larger is read each time, and no more of it than the query needs.
+    ``cache`` bounds the parsed documents that a worker process keeps, those of earlier calls
+    included, in bytes of their files. What is larger is read each time, and no more of it than the
+    query needs; with 0 that is each document, and none is kept.
 
     ``progress`` is called whenever a task is done, with the numbers of inputs done and failed.
     """
@@ -179,8 +182,8 @@ class _Done(NamedTuple):
 
     #: For each input its items, or what it failed with.
     results: List[Union[List[Any], BaseException]]
-    #: Of those that did not fail.
-    folded: Optional[List[Any]]
+    #: Of those that did not fail; None without a query for it, and what that failed with.
+    folded: Union[None, List[Any], BaseException]
 
 
 _MOST_QUERIES = 64
@@ -214,23 +217,28 @@ class _Documents:
 
     def get(self, path: str, query: xquery.Query, most: int) -> Any:
         status = os.stat(path)
-        if status.st_size > most:
-            return xquery.parse(pathlib.Path(path), query=query)
         key = (os.fspath(path), status.st_ino, status.st_mtime_ns, status.st_size)
         with self._lock:
+            # What an earlier call with a larger bound left behind goes as well.
+            self._drop_down_to(most)
             known = self._known.get(key)
             if known is not None:
                 self._known.move_to_end(key)
                 return known
+        if status.st_size > most or most == 0:
+            return xquery.parse(pathlib.Path(path), query=query)
         document = xquery.parse(pathlib.Path(path))
         with self._lock:
             if key not in self._known:
                 self._known[key] = document
                 self._size += status.st_size
-            while self._size > most:
-                dropped, _ = self._known.popitem(last=False)
-                self._size -= dropped[-1]
+            self._drop_down_to(most)
         return document
+
+    def _drop_down_to(self, most: int) -> None:
+        while self._size > most:
+            dropped, _ = self._known.popitem(last=False)
+            self._size -= dropped[-1]
 
 
 _documents = _Documents()
@@ -270,8 +278,13 @@ def _evaluate(work: _Work, paths: List[str]) -> _Done:
     if work.fold is None:
         return _Done(results, None)
     items = itertools.chain.from_iterable(each for each in results if isinstance(each, list))
-    folded = [_sent(item) for item in _combine(_compiled(work.fold), items)]
-    return _Done([[] if isinstance(each, list) else each for each in results], folded)
+    outcomes: List[Union[List[Any], BaseException]] = [
+        [] if isinstance(each, list) else each for each in results
+    ]
+    try:
+        return _Done(outcomes, [_sent(item) for item in _combine(_compiled(work.fold), items)])
+    except Exception as error:
+        return _Done(outcomes, _picklable(error))
 
 
 # --- where the client is --------------------------------------------------------------------------
@@ -309,6 +322,12 @@ class _Workers:
         """The same one for the same task of a later call, which then finds its documents parsed."""
         addresses = sorted(self.threads())
         return addresses[number % len(addresses)]
+
+
+def _error_of(future: Any) -> Optional[BaseException]:
+    """What a task ended with. One that was cancelled has no exception until its result is asked."""
+    error: Optional[BaseException] = future.exception()
+    return distributed.CancelledError(future.key) if future.cancelled() else error
 
 
 class _Run:
@@ -433,7 +452,7 @@ class _Run:
 
     def _receive(self, future: Any) -> None:
         task = self._tasks.pop(future)
-        error = future.exception()
+        error = _error_of(future)
         if isinstance(error, distributed.KilledWorker) and not task.is_alone:
             if len(task.paths) == 1:
                 self._suspects.append(task)
@@ -446,14 +465,17 @@ class _Run:
                 self._errors[task.start + offset] = error
         else:
             self._keep(task, future.result())
-        for path in task.paths:
-            for records in self._cut:
-                records.done(path)
+        for offset, path in enumerate(task.paths):
+            if task.start + offset not in self._errors:
+                for records in self._cut:
+                    records.done(path)
         self._done += len(task.paths)
         if self._progress is not None:
             self._progress(self._done, len(self._errors))
 
     def _keep(self, task: _Task, done: _Done) -> None:
+        if isinstance(done.folded, BaseException):
+            raise done.folded
         if done.folded is not None:
             self._folded[task.start] = done.folded
         for offset, result in enumerate(done.results):
