@@ -9,7 +9,7 @@ import io
 import os
 import threading
 from pathlib import Path
-from typing import Iterator, List
+from typing import Iterator, List, Optional
 
 import pytest
 
@@ -170,6 +170,24 @@ def test_a_loader_of_ones_own() -> None:
         return TEXT.encode()
 
     assert xquery.parse("http://example.org/x", loader=load).text == "\u00e4"
+
+
+@pytest.mark.parametrize(
+    "url, mime_type, is_html",
+    [
+        ("http://example.org/x", "text/html", True),
+        ("http://example.org/x", "TEXT/HTML", True),
+        ("http://example.org/x", None, False),
+        ("http://example.org/x.html?a", None, True),
+        ("http://example.org/x.html", "application/xml", False),
+    ],
+)
+def test_a_loader_says_what_is_html(url: str, mime_type: Optional[str], is_html: bool) -> None:
+    def load(url: str, purpose: str) -> xquery.Resource:
+        return xquery.Resource(b"<p>a</p>", mime_type)
+
+    root = xquery.parse(url, loader=load)[0]
+    assert root.name == ("html" if is_html else "p")
 
 
 def test_a_projected_document(books: xquery.Node) -> None:

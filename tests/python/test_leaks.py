@@ -99,6 +99,67 @@ def test_cycles_are_collected() -> None:
     assert [reference() for reference in gone] == [None] * 4
 
 
+class Reading:
+    """A file without an end."""
+
+    stream: Any = None
+    start = b"<a>"
+
+    def read(self, size: int = -1, /) -> bytes:
+        start, self.start = self.start, b""
+        return start + b"<b/>" * ((size - len(start)) // 4)
+
+
+def test_cycles_through_streams_are_collected() -> None:
+    gone: List[Any] = []
+    file = Reading()
+    file.stream = xquery.compile("/a/b").stream(file)
+    next(file.stream)
+    gone.append(weakref.ref(file))
+    del file
+    for keyword in ("loader", "trace", "missing", "modules"):
+
+        class Hearing:
+            stream: Any = None
+
+            def __call__(self, *event: object) -> None:
+                return None
+
+        heard = Hearing()
+        query = xquery.compile("/a/b", **{keyword: heard})  # type: ignore[arg-type]
+        heard.stream = query.stream("<a>" + "<b/>" * 1000 + "</a>")
+        next(heard.stream)
+        gone.append(weakref.ref(heard))
+        del heard, query
+    gc.collect()
+    assert [reference() for reference in gone] == [None] * 5
+
+
+def test_a_stream_may_be_let_go_of_by_what_it_reads_from(run_python: Run) -> None:
+    done = run_python(
+        "import gc, threading, xquery\n"
+        "class File:\n"
+        "    let_go, done, count = threading.Event(), threading.Event(), 0\n"
+        "    def read(self, size):\n"
+        "        self.count += 1\n"
+        "        if self.count == 1: return b'<a><b/>' + b' ' * 70000\n"
+        "        self.let_go.wait()\n"
+        "        gc.collect()\n"
+        "        self.done.set()\n"
+        "        return b''\n"
+        "file = File()\n"
+        "cycle = [xquery.compile('/a/b').stream(file)]\n"
+        "next(cycle[0])\n"
+        "cycle.append(cycle)\n"
+        "gc.disable()\n"
+        "del cycle\n"
+        "file.let_go.set()\n"
+        "file.done.wait()\n"
+        "print('done')\n"
+    )
+    assert (done.returncode, done.stdout, done.stderr) == (0, "done\n", "")
+
+
 def test_a_query_is_gone_with_its_last_reference() -> None:
     query = xquery.compile("1")
     gone = weakref.ref(query)

@@ -5,7 +5,7 @@ from __future__ import annotations
 import threading
 import warnings
 from pathlib import Path
-from typing import List, Optional, Tuple, Union
+from typing import Callable, List, Optional, Tuple, Union
 
 import pytest
 
@@ -52,6 +52,22 @@ def test_missing_documents_are_warnings(folder: Path) -> None:
     with pytest.warns(xquery.MissingDocumentWarning) as caught:
         xquery.query("doc('file:///none.xml')")
     assert str(caught[0].message) == "file:///none.xml: No such file or directory"
+
+
+def test_a_warning_is_one_of_the_line_that_calls_the_package(books: xquery.Node) -> None:
+    query = xquery.compile("doc('file:///none.xml')")
+    calls: List[Callable[[], object]] = [
+        lambda: query.evaluate(),
+        lambda: query.profile(),
+        lambda: xquery.query("doc('file:///none.xml')"),
+        lambda: xquery.Context().evaluate(query),
+        lambda: books.find("doc('file:///none.xml')"),
+        lambda: books.find_all("doc('file:///none.xml')"),
+    ]
+    for call in calls:
+        with pytest.warns(xquery.MissingDocumentWarning) as caught:
+            call()
+        assert [warning.filename for warning in caught] == [__file__]
 
 
 def test_a_warning_that_is_an_error_ends_the_evaluation() -> None:

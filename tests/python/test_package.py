@@ -11,7 +11,7 @@ import shutil
 import subprocess
 import sys
 from pathlib import Path
-from typing import Dict, List
+from typing import Callable, Dict, List
 
 import pytest
 
@@ -62,6 +62,17 @@ def test_everything_public_is_documented_and_listed() -> None:
     assert xquery.__all__ == sorted(xquery.__all__)
     page = (ROOT / "docs" / "python.md").read_text(encoding="utf-8")
     assert [name for name in xquery.__all__ if not re.search(rf"\b{name}\b", page)] == []
+
+
+def test_whatever_takes_settings_takes_all_of_them() -> None:
+    def keywords(function: Callable[..., object]) -> Dict[str, object]:
+        parameters = inspect.signature(function).parameters.values()
+        return {each.name: each.default for each in parameters if each.kind is each.KEYWORD_ONLY}
+
+    settings = inspect.signature(importlib.import_module("xquery._settings").Settings).parameters
+    defaults = {name: each.default for name, each in settings.items()}
+    assert len(defaults) > 5
+    assert keywords(xquery.compile) == keywords(xquery.Context) == defaults
 
 
 def mypy(*arguments: str, path: str = "") -> "subprocess.CompletedProcess[str]":

@@ -3,10 +3,11 @@
 from __future__ import annotations
 
 import datetime
+import time
 from datetime import timedelta, timezone
 from decimal import Decimal
 from fractions import Fraction
-from typing import Any, Iterator, List
+from typing import Any, Iterator, List, Optional
 
 import pytest
 
@@ -32,6 +33,26 @@ from xquery import (
 EAST = timezone(timedelta(hours=5, minutes=30))
 WEST = timezone(-timedelta(hours=3, minutes=30))
 SCHEMA = "http://www.w3.org/2001/XMLSchema"
+
+
+
+class Moving(datetime.tzinfo):
+    """A zone like those of ZoneInfo: which offset it has depends on the day."""
+
+    def utcoffset(self, moment: Optional[datetime.datetime]) -> Optional[timedelta]:
+        if moment is None:
+            return None
+        return timedelta(hours=2 if 4 <= moment.month <= 9 else 1)
+
+    def dst(self, moment: Optional[datetime.datetime]) -> Optional[timedelta]:
+        return None
+
+    def tzname(self, moment: Optional[datetime.datetime]) -> str:
+        return "Moving"
+
+    def __str__(self) -> str:
+        return "Moving"
+
 
 SAME = xquery.compile("declare variable $v external; $v")
 
@@ -241,12 +262,61 @@ def test_refused_for_its_type(value: Any) -> None:
         (Date(2026, 2, 30), "30"),
         (datetime.datetime(2026, 1, 1, tzinfo=timezone(timedelta(seconds=30))), "whole minutes"),
         (datetime.datetime(2026, 1, 1, tzinfo=timezone(timedelta(hours=20))), "1200"),
+        (datetime.time(1, tzinfo=Moving()), "Moving has no offset from UTC"),
+        (GYear(2026, Moving()), "Moving has no offset from UTC"),
+        (DateTime(12026, 1, 1, tzinfo=Moving()), "Moving has no offset from UTC"),
     ],
     ids=repr,
 )
 def test_refused_for_its_value(value: Any, reason: str) -> None:
     with pytest.raises(ValueError, match=reason):
         SAME.evaluate(v=value)
+
+
+@pytest.mark.parametrize(
+    "value",
+    [
+        Decimal("1E+90000000"),
+        Decimal("-1E-90000000"),
+        Decimal("1E+250000"),
+        Decimal("1E-250001"),
+        Decimal((0, (1,) * 250_001, -5)),
+        1 << 1_000_001,
+        -(1 << 100_000_000),
+    ],
+    ids=["large", "small", "one digit too many", "behind the point", "both", "int", "large int"],
+)
+def test_more_digits_than_a_decimal_has_are_refused_at_once(value: Any) -> None:
+    started = time.process_time()
+    with pytest.raises(ValueError, match="out of the range of xs:(decimal|integer)"):
+        SAME.evaluate(v=value)
+    assert time.process_time() - started < 0.5
+
+
+def test_as_many_digits_as_a_decimal_has_are_taken() -> None:
+    for value in (Decimal("1E+249999"), Decimal("1E-250000"), Decimal("-7E+249999")):
+        assert back(value) == value
+    for zero in (Decimal("0E+90000000"), Decimal("-0E-90000000")):
+        assert back(zero) == 0
+
+
+def test_a_zone_that_moves_is_given_by_its_offset() -> None:
+    for month, hours in ((1, 1), (7, 2)):
+        given = datetime.datetime(2026, month, 1, 12, tzinfo=Moving())
+        arrived = back(given)
+        assert arrived.tzinfo == timezone(timedelta(hours=hours))
+        assert arrived.replace(tzinfo=None) == given.replace(tzinfo=None)
+
+
+def test_the_longest_timedeltas() -> None:
+    assert back(timedelta.min) == timedelta.min
+    longest = timedelta(days=999999999)
+    assert back(longest) == longest
+    assert back(longest + timedelta(hours=23)) == longest + timedelta(hours=23)
+    # Nearest to it as a double of seconds, and no timedelta any more.
+    assert back(timedelta.max) == Duration(days=1000000000)
+    assert back(timedelta.min + timedelta.resolution) == timedelta.min
+    assert xquery.query("xdt:dayTimeDuration('P1000000000D')").one() == Duration(days=1000000000)
 
 
 def test_a_list_that_holds_itself_is_refused() -> None:

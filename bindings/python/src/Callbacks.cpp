@@ -1,6 +1,5 @@
 #include "Callbacks.h"
 
-#include "Hearing.h"
 #include "Results.h"
 #include "Settings.h"
 #include "Values.h"
@@ -13,25 +12,6 @@ namespace {
 
 // Set when the interpreter begins to end.
 std::atomic<bool> isEnding = false;
-
-// An object that is let go of on any thread.
-class Kept {
- public:
-  explicit Kept(py::object object) : _object(std::move(object)) {}
-  ~Kept() {
-    if (!isInterpreterAlive()) {
-      (void)_object.release();
-      return;
-    }
-    locked([&] { _object = py::object(); });
-  }
-  Kept(const Kept&) = delete;
-  Kept& operator=(const Kept&) = delete;
-  const py::object& get() const { return _object; }
-
- private:
-  py::object _object;
-};
 
 constexpr const char* nameOf(XQueryLoadPurpose purpose) {
   switch (purpose) {
@@ -52,8 +32,7 @@ std::string dataFrom(const py::object& data) {
     // Whatever encoding it says that it had as bytes.
     return py::module_::import("xquery._documents").attr("_utf8")(data).cast<std::string>();
   }
-  const py::object bytes = py::reinterpret_steal<py::object>(PyBytes_FromObject(data.ptr()));
-  if (!bytes) throw py::error_already_set();
+  const py::object bytes = steal(PyBytes_FromObject(data.ptr()));
   return {PyBytes_AS_STRING(bytes.ptr()), static_cast<size_t>(PyBytes_GET_SIZE(bytes.ptr()))};
 }
 
@@ -74,24 +53,35 @@ std::optional<XQueryResource> resourceFrom(const py::object& answer) {
   return resource;
 }
 
+// Keeps the settings and no function itself: the collector of cycles looks into those. May be let
+// go of on any thread.
 class Loader : public XQueryLoader {
  public:
-  Loader(const py::object& load, const py::object& modules) : _load(load), _modules(modules) {}
+  explicit Loader(std::shared_ptr<const Settings> settings) : _settings(std::move(settings)) {}
+  ~Loader() override {
+    if (isInterpreterAlive()) {
+      locked([&] { _settings = nullptr; });
+    } else {
+      new std::shared_ptr<const Settings>(std::move(_settings));  // nobody can take the lock
+    }
+  }
+  Loader(const Loader&) = delete;
+  Loader& operator=(const Loader&) = delete;
 
   std::optional<XQueryResource> load(const NSURL& URL, XQueryLoadPurpose purpose) override {
     if (!isInterpreterAlive()) return std::nullopt;
     return locked([&] {
-      const py::object& modules = _modules.get();
-      const bool isModule = purpose == XQueryLoadPurpose::Module && !modules.is_none();
+      const py::object modules = _settings->modules, loader = _settings->loader;
       const py::object text = toStr(URL.absoluteString()->view());
+      const bool isModule = purpose == XQueryLoadPurpose::Module && !modules.is_none();
       if (isModule) return resourceFrom(modules(text));
-      if (_load.get().is_none()) return std::optional<XQueryResource>();
-      return resourceFrom(_load.get()(text, nameOf(purpose)));
+      if (loader.is_none()) return std::optional<XQueryResource>();
+      return resourceFrom(loader(text, nameOf(purpose)));
     });
   }
 
  private:
-  Kept _load, _modules;
+  std::shared_ptr<const Settings> _settings;
 };
 
 py::object resultOf(const Value& value) {
@@ -106,13 +96,36 @@ py::object resultOf(const Value& value) {
 void tellMissing(const Settings& settings, const XQueryMissingDocument& document) {
   const py::object missing = settings.missing;
   const py::object URL = toStr(document.URL), reason = toStr(document.reason);
-  if (!missing.is_none()) {
-    missing(URL, reason);
+  if (missing.is_none()) {
+    known().warnOfMissing(URL, reason);
   } else {
-    // Of the caller of the package, which itself is one call.
-    known().warn(toStr(document.URL + ": " + document.reason), known().missingWarning, 2);
+    missing(URL, reason);
   }
 }
+
+// Who hears of traces and of missing documents. Without a function for traces they are written to
+// the log. Lives as long as the settings do.
+class Client : public XQueryClient {
+ public:
+  explicit Client(const Settings& settings) : _settings(settings) {}
+
+  void XQueryClientTraceValue(const Value& value, const Ref<NSString>& label,
+                              XQueryContext& context) override {
+    if (!_isTraced) return XQueryClient::XQueryClientTraceValue(value, label, context);
+    locked([&] {
+      const py::object trace = _settings.trace;
+      trace(toStr(label->view()), resultOf(value));
+    });
+  }
+
+  void XQueryClientMissesDocument(const XQueryMissingDocument& document, XQueryContext&) override {
+    locked([&] { tellMissing(_settings, document); });
+  }
+
+ private:
+  const Settings& _settings;
+  const bool _isTraced = !_settings.trace.is_none();
+};
 
 }  // namespace
 
@@ -120,23 +133,12 @@ bool isInterpreterAlive() {
   return !isEnding && Py_IsInitialized();
 }
 
-std::shared_ptr<XQueryLoader> makeLoader(const py::object& load, const py::object& modules) {
-  return std::make_shared<Loader>(load, modules);
+std::shared_ptr<XQueryLoader> makeLoader(std::shared_ptr<const Settings> settings) {
+  return std::make_shared<Loader>(std::move(settings));
 }
 
 std::shared_ptr<XQueryClient> makeClient(const Settings& settings) {
-  TraceHearing hear;
-  if (!settings.trace.is_none()) {
-    hear = [&settings](const Value& value, const Ref<NSString>& label) {
-      locked([&] {
-        const py::object trace = settings.trace;
-        trace(toStr(label->view()), resultOf(value));
-      });
-    };
-  }
-  return clientHearing(std::move(hear), [&settings](const XQueryMissingDocument& document) {
-    locked([&] { tellMissing(settings, document); });
-  });
+  return std::make_shared<Client>(settings);
 }
 
 void addCallbacks(py::module_& module) {

@@ -13,9 +13,9 @@ struct Settings;
 // Whether threads of the library may ask for the interpreter's lock: not once its end has begun.
 bool isInterpreterAlive();
 
-// For every purpose `load`, but for library modules `modules` where it is not None; either may be
-// None.
-std::shared_ptr<XQueryLoader> makeLoader(const py::object& load, const py::object& modules);
+// For every purpose the loader of the settings, but for library modules `modules` where it is not
+// None; either may be None.
+std::shared_ptr<XQueryLoader> makeLoader(std::shared_ptr<const Settings> settings);
 
 // Calls the functions of the settings, which must live as long as it is used. Without a function
 // traces are written to the log, and missing documents are warnings.

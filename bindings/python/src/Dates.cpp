@@ -19,11 +19,6 @@ void needDatetime() {
   if (!PyDateTimeAPI) throw py::error_already_set();
 }
 
-py::object steal(PyObject* object) {
-  if (!object) throw py::error_already_set();
-  return py::reinterpret_steal<py::object>(object);
-}
-
 py::object toTimezone(const std::optional<std::chrono::minutes>& zone) {
   if (!zone) return py::none();
   if (zone->count() == 0) return py::reinterpret_borrow<py::object>(PyDateTime_TimeZone_UTC);
@@ -86,9 +81,13 @@ py::object toTimedelta(const Value& value) {
   if (!duration) throw py::value_error(duration.error()->msg()->utf8());
   const double seconds = duration->count();
   double days = std::floor(seconds / secondsInDay);
-  // A multiple of a microsecond as near as a double comes to it.
-  const double rest = std::round((seconds - days * secondsInDay) * microseconds);
-  if (days < -mostDays || days >= mostDays) {
+  // A multiple of a microsecond as near as a double comes to it, which may be that of the next day.
+  double rest = std::round((seconds - days * secondsInDay) * microseconds);
+  if (rest >= secondsInDay * microseconds) {
+    rest = 0;
+    ++days;
+  }
+  if (days < -mostDays || days > mostDays) {
     const double magnitude = std::fabs(seconds), wholeDays = std::floor(magnitude / secondsInDay);
     return known().duration(py::arg("days") = py::int_(py::float_(wholeDays)),
                             py::arg("seconds") = magnitude - wholeDays * secondsInDay,
@@ -109,10 +108,16 @@ py::object toDuration(const Value& value) {
 
 // --- from Python ---------------------------------------------------------------------------------
 
-// The zone of a datetime or a time, as far as it has one.
+// The zone of a datetime or a time, as far as it has one. That of a ZoneInfo has no offset without
+// a day, and would be lost in silence.
 std::optional<std::chrono::minutes> zoneOf(py::handle object) {
   const py::object offset = object.attr("utcoffset")();
-  if (offset.is_none()) return std::nullopt;
+  if (offset.is_none()) {
+    const py::object zone = object.attr("tzinfo");
+    if (zone.is_none()) return std::nullopt;
+    throw py::value_error(fromStr(py::str(zone)) +
+                          " has no offset from UTC without a day and a time");
+  }
   const int64_t seconds = int64_t{PyDateTime_DELTA_GET_DAYS(offset.ptr())} * 86400 +
                           PyDateTime_DELTA_GET_SECONDS(offset.ptr());
   if (seconds % 60 != 0 || PyDateTime_DELTA_GET_MICROSECONDS(offset.ptr()) != 0) {

@@ -7,8 +7,7 @@
 //   - the interpreter's lock is released while the library compiles, evaluates or reads, and held
 //     wherever a Python object is touched
 //   - objects of Python that the library calls back are kept during the call alone, or by
-//   `Settings`
-//     which the collector of cycles can look into; so no cycle hides in the library
+//     `Settings`, which the collector of cycles can look into; so no cycle hides in the library
 //   - classes and functions of Python that are needed often are looked up once and never given
 //     back, since the order in which things go when a process ends is nobody's to know
 #pragma once
@@ -34,8 +33,8 @@ void addStreams(py::module_& module);
 
 // What is made or asked for often and is written in Python.
 struct Known {
-  py::handle decimal, mapping, path, warn;
-  py::handle place, call, error, limitError, compileError, documentError, missingWarning;
+  py::handle decimal, mapping;
+  py::handle place, call, error, limitError, compileError, documentError, warnOfMissing;
   py::handle URI, untyped, notation, hexBinary, qName, dateTime, date, time, duration,
       monthDuration, gYearMonth, gYear, gMonthDay, gMonth, gDay;
 };
@@ -49,5 +48,25 @@ py::object toStr(std::string_view utf8);
 py::object toStrOrNone(const Ref<NSString>& text);
 // Raises ValueError for a str with a surrogate of its own.
 std::string fromStr(const py::handle& text);
+
+// What a function of Python's C interface answers: a reference of the caller's own, or null where
+// it has failed, which is raised.
+py::object steal(PyObject* object);
+
+// --- collection of cycles ------------------------------------------------------------------------
+
+// What an object of one of the module's classes holds; null for one that is not made yet.
+template <class T>
+T* madeObject(PyObject* self) {
+  const auto holder = reinterpret_cast<py::detail::instance*>(self)->get_value_and_holder();
+  return holder.holder_constructed() ? static_cast<T*>(holder.value_ptr()) : nullptr;
+}
+
+// For the set-up of a class whose objects keep objects of Python.
+inline void takePartInCollection(PyHeapTypeObject* type, traverseproc traverse, inquiry clear) {
+  type->ht_type.tp_flags |= Py_TPFLAGS_HAVE_GC;
+  type->ht_type.tp_traverse = traverse;
+  type->ht_type.tp_clear = clear;
+}
 
 }  // namespace xquery::python

@@ -78,7 +78,7 @@ class Prepared {
 };
 
 Result run(XQueryContext& context, const XQuery& query, const Settings& settings, bool isKept,
-           const XQueryVariables& constants, const Value& item) {
+           const XQueryVariables& variables, const Value& item) {
   const UnderWay underWay(settings.cancellation);
   const Prepared prepared(context, settings, underWay, isKept);
   Ref<XQueryError> error;
@@ -86,7 +86,7 @@ Result run(XQueryContext& context, const XQuery& query, const Settings& settings
   Ref<NSError> failure;
   {
     const Unlocked released;
-    items = context.evaluateXQuery(query, constants, item, &error);
+    items = context.evaluateXQuery(query, variables, item, &error);
     failure = XQueryFirstError(items, error);
   }
   underWay.raiseWhatHandlersRaise();
@@ -103,10 +103,10 @@ Value contextItemFrom(const py::object& item) {
 }
 
 Result evaluate(const Compiled& compiled, const Settings& settings, const py::object& item,
-                const py::dict& variables) {
-  const XQueryVariables constants = constantsFrom(variables);
+                const py::dict& given) {
+  const XQueryVariables variables = variablesFrom(given);
   const Ref<XQueryContext> context = newContext(settings);
-  return run(*context, *compiled.query, settings, false, constants, contextItemFrom(item));
+  return run(*context, *compiled.query, settings, false, variables, contextItemFrom(item));
 }
 
 // --- sessions ------------------------------------------------------------------------------------
@@ -128,11 +128,11 @@ class Taken {
 };
 
 Result evaluateIn(Session& session, const Compiled& compiled, const Settings& settings,
-                  const py::object& item, const py::dict& variables) {
+                  const py::object& item, const py::dict& given) {
   const Taken taken(session);
   if (!session.context) throw py::value_error("the context is closed");
-  const XQueryVariables constants = constantsFrom(variables);
-  return run(*session.context, *compiled.query, settings, true, constants, contextItemFrom(item));
+  const XQueryVariables variables = variablesFrom(given);
+  return run(*session.context, *compiled.query, settings, true, variables, contextItemFrom(item));
 }
 
 void close(Session& session) {
@@ -201,15 +201,15 @@ py::object describe(const Profile& self, const std::string& format) {
 }
 
 Result evaluateProfiled(const Compiled& compiled, Profile& profile, const Settings& settings,
-                        const py::object& item, const py::dict& variables) {
-  const XQueryVariables constants = constantsFrom(variables);
+                        const py::object& item, const py::dict& given) {
+  const XQueryVariables variables = variablesFrom(given);
   const Ref<XQueryContext> context = newContext(settings);
   struct Adding {
     Profile& profile;
     const XQueryContext& context;
     ~Adding() { profile.profile.add(context); }
   } adding{profile, *context};
-  return run(*context, *compiled.query, settings, false, constants, contextItemFrom(item));
+  return run(*context, *compiled.query, settings, false, variables, contextItemFrom(item));
 }
 
 // --- finding -------------------------------------------------------------------------------------

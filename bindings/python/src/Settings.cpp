@@ -81,16 +81,9 @@ std::shared_ptr<Settings> make(const std::optional<double>& seconds,
 
 // --- collection of cycles ------------------------------------------------------------------------
 
-// Null for an object that is not made yet.
-Settings* settingsOf(PyObject* self) {
-  auto* instance = reinterpret_cast<py::detail::instance*>(self);
-  const auto holder = instance->get_value_and_holder();
-  return holder.holder_constructed() ? static_cast<Settings*>(holder.value_ptr()) : nullptr;
-}
-
 int traverse(PyObject* self, visitproc visit, void* arg) {
   Py_VISIT(Py_TYPE(self));
-  if (const Settings* settings = settingsOf(self)) {
+  if (const Settings* settings = madeObject<Settings>(self)) {
     Py_VISIT(settings->loader.ptr());
     Py_VISIT(settings->modules.ptr());
     Py_VISIT(settings->trace.ptr());
@@ -100,19 +93,13 @@ int traverse(PyObject* self, visitproc visit, void* arg) {
 }
 
 int clear(PyObject* self) {
-  if (Settings* settings = settingsOf(self)) {
+  if (Settings* settings = madeObject<Settings>(self)) {
     settings->loader = py::none();
     settings->modules = py::none();
     settings->trace = py::none();
     settings->missing = py::none();
   }
   return 0;
-}
-
-void takePartInCollection(PyHeapTypeObject* type) {
-  type->ht_type.tp_flags |= Py_TPFLAGS_HAVE_GC;
-  type->ht_type.tp_traverse = traverse;
-  type->ht_type.tp_clear = clear;
 }
 
 }  // namespace
@@ -125,13 +112,13 @@ XQueryLimits Settings::limitsOf(const UnderWay& underWay) const {
 
 XQueryLoading Settings::loadingOfDocuments() const {
   XQueryLoading own = loading;
-  if (!loader.is_none()) own.loader = makeLoader(loader, py::none());
+  if (!loader.is_none()) own.loader = makeLoader(shared_from_this());
   return own;
 }
 
 XQueryLoading Settings::loadingOfModules() const {
   XQueryLoading own = loading;
-  if (!loader.is_none() || !modules.is_none()) own.loader = makeLoader(loader, modules);
+  if (!loader.is_none() || !modules.is_none()) own.loader = makeLoader(shared_from_this());
   return own;
 }
 
@@ -155,7 +142,9 @@ void addSettings(py::module_& module) {
       .def("cancel", &Cancellation::raise)
       .def_property_readonly("is_cancelled", &Cancellation::isRaised);
   py::class_<Settings, std::shared_ptr<Settings>>(module, "Settings",
-                                                  py::custom_type_setup(takePartInCollection))
+                                                  py::custom_type_setup([](PyHeapTypeObject* type) {
+                                                    takePartInCollection(type, traverse, clear);
+                                                  }))
       .def(py::init(&make), py::kw_only(), py::arg("seconds"), py::arg("memory"), py::arg("policy"),
            py::arg("url"), py::arg("namespaces"), py::arg("cancellation"), py::arg("loader"),
            py::arg("modules"), py::arg("trace"), py::arg("missing"));

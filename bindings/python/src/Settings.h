@@ -10,7 +10,7 @@ namespace xquery::python {
 
 // xquery._xquery.Settings. Immutable. It keeps functions of Python, which may lead back to it, and
 // so it takes part in the collection of cycles.
-struct Settings {
+struct Settings : std::enable_shared_from_this<Settings> {
   XQueryLimits limits;    // its flag is not set
   XQueryLoading loading;  // its loader is not set
   std::map<std::string, std::string> namespaces;

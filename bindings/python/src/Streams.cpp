@@ -6,7 +6,9 @@
 // well.
 //
 // The thread ends when the document does, when the stream is closed or let go of, and when the
-// package is told that the interpreter ends.
+// package is told that the interpreter ends. What it works with, a `Production`, lives as long as
+// either of the two needs it: where the stream is let go of by what it reads from, on that very
+// thread, nobody can wait for the thread, which then ends by itself.
 #include "Callbacks.h"
 #include "Errors.h"
 #include "Queries.h"
@@ -52,6 +54,11 @@ struct Channel {
     if (waiting.size() == 1) changed.notify_all();
     return true;
   }
+  void close() {
+    const std::lock_guard held(lock);
+    isClosed = true;
+    changed.notify_all();
+  }
 };
 
 // One thread asks at a time.
@@ -76,95 +83,59 @@ class Asking {
   Channel& _channel;
 };
 
-class Stream {
+// What the thread works with. Made and let go of with the interpreter's lock held.
+class Production {
  public:
-  Stream(const Compiled& compiled, std::shared_ptr<Settings> kept, std::string path,
-         py::object read, std::string name, const py::dict& variables)
-      : _query(compiled.query),
-        _settings(std::move(kept)),
+  Production(Ref<XQuery> query, std::shared_ptr<const Settings> settings, std::string path,
+             py::object read, const py::dict& given)
+      : _query(std::move(query)),
+        _settings(std::move(settings)),
         _read(std::move(read)),
-        _name(std::move(name)),
-        _constants(constantsFrom(variables)),
-        _cancellation(_settings->cancellation) {
-    const Settings& settings = *_settings;
-    _context = XQueryContext::xqueryContextWithNamespaces(settings.namespaces);
-    _context->contextSetLoading(settings.loadingOfDocuments());
-    _context->contextSetClient(settings.client);
-    XQueryLimits limits = settings.limits;
-    limits.cancelled = _flag;
+        _variables(variablesFrom(given)),
+        _context(XQueryContext::xqueryContextWithNamespaces(_settings->namespaces)) {
+    _context->contextSetLoading(_settings->loadingOfDocuments());
+    _context->contextSetClient(_settings->client);
+    XQueryLimits limits = _settings->limits;
+    limits.cancelled = flag;
     _context->contextSetLimits(limits);
-    if (_cancellation) _cancellation->add(_flag);
     _input.path = std::move(path);
     _input.options = NSXMLNodePreserveWhitespace;
-    if (!_read.is_none()) {
-      _input.read = [this](char* buffer, size_t size) { return readFromPython(buffer, size); };
-    }
-    _thread = std::thread([this] { produce(); });
+    if (_read.is_none()) return;
+    _input.read = [this](char* buffer, size_t size) { return readFromPython(buffer, size); };
   }
+  Production(const Production&) = delete;
+  Production& operator=(const Production&) = delete;
 
-  ~Stream() { close(); }
-  Stream(const Stream&) = delete;
-  Stream& operator=(const Stream&) = delete;
-
-  // The next item, made an object of Python; raises StopIteration at the end.
-  py::object next() {
-    const Asking asking(_channel);
-    if (_taken.empty()) take();
-    if (_taken.empty()) end();
-    const Value item = std::move(_taken.front());
-    _taken.pop_front();
-    return toPython(*item);
-  }
-
-  // From any thread: one that asks meanwhile finds that the stream has ended.
-  void close() {
-    if (!_thread.joinable()) return;
-    if (_thread.get_id() == std::this_thread::get_id()) {
-      throw std::runtime_error("a stream cannot be closed by what it reads from");
-    }
-    // With the interpreter's lock held, so that only one thread waits for it.
-    std::thread thread = std::move(_thread);
-    _flag->store(true);
-    {
-      const Unlocked released;
-      {
-        std::unique_lock held(_channel.lock);
-        _channel.isClosed = true;
-        _channel.changed.notify_all();
-        const auto self = std::this_thread::get_id();
-        _channel.changed.wait(
-            held, [&] { return _channel.asking == std::thread::id() || _channel.asking == self; });
-      }
-      thread.join();
-    }
-    finish();
-  }
-
- private:
-  void produce() {
+  // Without the interpreter's lock.
+  void run() {
     XQueryStreamFailure failure;
     std::exception_ptr thrown;
     try {
-      const auto receive = [this](const Value& item) { return _channel.put(apart(item)); };
-      (void)_context->evaluateStream(*_query, _constants, _input, receive, failure);
+      const auto receive = [this](const Value& item) { return channel.put(apart(item)); };
+      (void)_context->evaluateStream(*_query, _variables, _input, receive, failure);
     } catch (...) {
       thrown = std::current_exception();
     }
-    const std::lock_guard held(_channel.lock);
-    _channel.failure = std::move(failure);
-    if (thrown) _channel.thrown = thrown;
-    _channel.isDone = true;
-    _channel.changed.notify_all();
+    const std::lock_guard held(channel.lock);
+    channel.failure = std::move(failure);
+    if (thrown) channel.thrown = thrown;
+    channel.isDone = true;
+    channel.changed.notify_all();
   }
 
-  // Called by the library, without the interpreter's lock.
+  // For the collection of cycles.
+  PyObject* read() const { return _read.ptr(); }
+
+  const Cancellation::Flag flag = std::make_shared<std::atomic<bool>>(false);
+  Channel channel;
+
+ private:
   ptrdiff_t readFromPython(char* buffer, size_t size) {
     if (!isInterpreterAlive()) return -1;
     try {
       return locked([&] {
         const py::object data = _read(size);
-        const auto bytes = py::reinterpret_steal<py::object>(PyBytes_FromObject(data.ptr()));
-        if (!bytes) throw py::error_already_set();
+        const py::object bytes = steal(PyBytes_FromObject(data.ptr()));
         const auto length = static_cast<size_t>(PyBytes_GET_SIZE(bytes.ptr()));
         if (length > size) {
           throw py::value_error("read() answered more bytes than it was asked for");
@@ -173,24 +144,120 @@ class Stream {
         return static_cast<ptrdiff_t>(length);
       });
     } catch (...) {
-      const std::lock_guard held(_channel.lock);
-      _channel.thrown = std::current_exception();
+      const std::lock_guard held(channel.lock);
+      channel.thrown = std::current_exception();
       return -1;
     }
   }
 
+  const Ref<XQuery> _query;
+  const std::shared_ptr<const Settings> _settings;
+  const py::object _read;
+  const XQueryVariables _variables;
+  const Ref<XQueryContext> _context;
+  XQueryStreamInput _input;
+};
+
+using SharedProduction = std::shared_ptr<Production>;
+
+// Lets go on a thread that has not the interpreter's lock.
+void letGo(SharedProduction production) {
+  if (isInterpreterAlive()) {
+    locked([&] { production = nullptr; });
+  } else {
+    new SharedProduction(std::move(production));  // nobody can take the lock
+  }
+}
+
+class Stream {
+ public:
+  Stream(const Compiled& compiled, py::object kept, std::string path, py::object read,
+         std::string name, const py::dict& variables)
+      : _kept(std::move(kept)), _name(std::move(name)) {
+    const auto settings = _kept.cast<std::shared_ptr<Settings>>();
+    _production = std::make_shared<Production>(compiled.query, settings, std::move(path),
+                                               std::move(read), variables);
+    _cancellation = settings->cancellation;
+    if (_cancellation) _cancellation->add(_production->flag);
+    _thread = std::thread([production = _production]() mutable {
+      production->run();
+      letGo(std::move(production));
+    });
+  }
+
+  ~Stream() { letGoOfAll(); }
+  Stream(const Stream&) = delete;
+  Stream& operator=(const Stream&) = delete;
+
+  // The next item, made an object of Python; raises StopIteration at the end.
+  py::object next() {
+    if (!_production) throw py::stop_iteration();
+    const SharedProduction production = _production;
+    const Asking asking(production->channel);
+    if (_taken.empty()) take(production->channel);
+    if (_taken.empty()) end(*production);
+    const Value item = std::move(_taken.front());
+    _taken.pop_front();
+    return toPython(*item);
+  }
+
+  // From any thread: one that asks meanwhile finds that the stream has ended.
+  void close() {
+    if (!_thread.joinable()) return;
+    if (isOnItsThread()) {
+      throw std::runtime_error("a stream cannot be closed by what it reads from");
+    }
+    // With the interpreter's lock held, so that only one thread waits for it.
+    std::thread thread = std::move(_thread);
+    const SharedProduction production = _production;
+    production->flag->store(true);
+    {
+      const Unlocked released;
+      Channel& channel = production->channel;
+      channel.close();
+      {
+        std::unique_lock held(channel.lock);
+        const auto self = std::this_thread::get_id();
+        channel.changed.wait(
+            held, [&] { return channel.asking == std::thread::id() || channel.asking == self; });
+      }
+      thread.join();
+    }
+    finish();
+  }
+
+  // As `close`, but without waiting where the thread itself does it.
+  void letGoOfAll() {
+    if (_thread.joinable() && isOnItsThread()) {
+      _production->flag->store(true);
+      _production->channel.close();
+      _thread.detach();
+      finish();
+    }
+    close();
+  }
+
+  int traverse(visitproc visit, void* arg) const {
+    Py_VISIT(_kept.ptr());
+    if (_production) Py_VISIT(_production->read());
+    return 0;
+  }
+
+ private:
+  bool isOnItsThread() const { return _thread.get_id() == std::this_thread::get_id(); }
+
   // Waits for items, and takes all that there are.
-  void take() {
+  void take(Channel& channel) {
     bool isKnown = false;
     while (!isKnown) {
       {
         const Unlocked released;
-        std::unique_lock held(_channel.lock);
-        isKnown = _channel.changed.wait_for(held, lookAtSignals, [&] {
-          return !_channel.waiting.empty() || _channel.isDone || _channel.isClosed;
+        std::unique_lock held(channel.lock);
+        isKnown = channel.changed.wait_for(held, lookAtSignals, [&] {
+          return !channel.waiting.empty() || channel.isDone || channel.isClosed;
         });
-        _taken.swap(_channel.waiting);
-        _channel.changed.notify_all();
+        _taken.swap(channel.waiting);
+        channel.changed.notify_all();
       }
       if (PyErr_CheckSignals() != 0) {
         const py::error_already_set interrupt;
@@ -201,46 +268,54 @@ class Stream {
   }
 
   // Nothing is left: how it ended.
-  [[noreturn]] void end() {
+  [[noreturn]] void end(Production& production) {
     const bool wasClosed = !_thread.joinable();
     close();
     if (wasClosed) throw py::stop_iteration();
-    if (_channel.thrown) std::rethrow_exception(std::exchange(_channel.thrown, nullptr));
-    if (_channel.failure.error) raise(*_channel.failure.error);
-    if (!_channel.failure.reading.message.empty()) raise(_channel.failure.reading, _name);
+    Channel& channel = production.channel;
+    if (channel.thrown) std::rethrow_exception(std::exchange(channel.thrown, nullptr));
+    if (channel.failure.error) raise(*channel.failure.error);
+    if (!channel.failure.reading.message.empty()) raise(channel.failure.reading, _name);
     throw py::stop_iteration();
   }
 
   void finish() {
-    if (_cancellation) _cancellation->remove(_flag);
+    if (_cancellation) _cancellation->remove(_production->flag);
     _cancellation = nullptr;
-    _context = nullptr;
-    _constants.clear();
     _taken.clear();
-    _channel.waiting.clear();
-    _read = py::none();
+    _production = nullptr;
+    _kept = py::none();
   }
 
-  Ref<XQuery> _query;
-  std::shared_ptr<Settings> _settings;
-  Ref<XQueryContext> _context;
-  py::object _read;
+  py::object _kept;  // the settings
   std::string _name;
-  XQueryVariables _constants;
+  SharedProduction _production;  // null once closed
   std::shared_ptr<Cancellation> _cancellation;
-  Cancellation::Flag _flag = std::make_shared<std::atomic<bool>>(false);
-  XQueryStreamInput _input;
-  Channel _channel;
   std::deque<Value> _taken;  // by the iterating thread
   std::thread _thread;
 };
 
+// --- collection of cycles ------------------------------------------------------------------------
+
+int traverse(PyObject* self, visitproc visit, void* arg) {
+  Py_VISIT(Py_TYPE(self));
+  const Stream* stream = madeObject<Stream>(self);
+  return stream ? stream->traverse(visit, arg) : 0;
+}
+
+int clear(PyObject* self) {
+  if (Stream* stream = madeObject<Stream>(self)) stream->letGoOfAll();
+  return 0;
+}
+
 }  // namespace
 
 void addStreams(py::module_& module) {
-  py::class_<Stream>(module, "Stream")
-      .def(py::init<const Compiled&, std::shared_ptr<Settings>, std::string, py::object,
-                    std::string, const py::dict&>())
+  py::class_<Stream>(module, "Stream", py::custom_type_setup([](PyHeapTypeObject* type) {
+                       takePartInCollection(type, traverse, clear);
+                     }))
+      .def(py::init<const Compiled&, py::object, std::string, py::object, std::string,
+                    const py::dict&>())
       .def("__next__", &Stream::next)
       .def("close", &Stream::close);
 }

@@ -6,6 +6,11 @@
 
 namespace xquery::python {
 
+py::object steal(PyObject* object) {
+  if (!object) throw py::error_already_set();
+  return py::reinterpret_steal<py::object>(object);
+}
+
 py::object toStr(NSStringView text) {
   PyObject* result = nullptr;
   if (text.isWide()) {
@@ -18,15 +23,11 @@ py::object toStr(NSStringView text) {
       std::memcpy(PyUnicode_1BYTE_DATA(result), text.asciiUnits(), text.length());
     }
   }
-  if (!result) throw py::error_already_set();
-  return py::reinterpret_steal<py::object>(result);
+  return steal(result);
 }
 
 py::object toStr(std::string_view utf8) {
-  PyObject* result =
-      PyUnicode_DecodeUTF8(utf8.data(), static_cast<Py_ssize_t>(utf8.size()), "replace");
-  if (!result) throw py::error_already_set();
-  return py::reinterpret_steal<py::object>(result);
+  return steal(PyUnicode_DecodeUTF8(utf8.data(), static_cast<Py_ssize_t>(utf8.size()), "replace"));
 }
 
 py::object toStrOrNone(const Ref<NSString>& text) {

@@ -14,7 +14,7 @@ py::object toPython(const NSObject& item);
 Value fromPython(py::handle object);
 
 // The names of a dictionary without the dollar sign, and the values for them.
-XQueryVariables constantsFrom(const py::dict& variables);
+XQueryVariables variablesFrom(const py::dict& given);
 
 // Dates, times and durations, with the classes of their own where Python's cannot hold the value.
 py::object dateToPython(const Value& value, XQueryItemType type);

@@ -7,11 +7,6 @@
 namespace xquery::python {
 namespace {
 
-py::object steal(PyObject* object) {
-  if (!object) throw py::error_already_set();
-  return py::reinterpret_steal<py::object>(object);
-}
-
 [[noreturn]] void refuse(py::handle object) {
   throw py::type_error("a value of type " + std::string(Py_TYPE(object.ptr())->tp_name) +
                        " has no counterpart in a query");
@@ -22,12 +17,20 @@ std::string digitsOf(py::handle decimal) {
   return fromStr(steal(PyObject_Format(decimal.ptr(), py::str("f").ptr())));
 }
 
+// The library takes no more digits, before and after the point taken together. What certainly has
+// more is refused before they are written: an exponent of nine digits asks for as many zeros.
+constexpr int64_t mostDigits = 250'000;
+
 Value integerFromPython(py::handle object) {
   int overflow = 0;
   const long long value = PyLong_AsLongLongAndOverflow(object.ptr(), &overflow);
   if (overflow == 0) {
     if (value == -1 && PyErr_Occurred()) throw py::error_already_set();
     return XQueryMakeInteger(value);
+  }
+  constexpr int64_t bitsOfDigit = 4;  // at most
+  if (object.attr("bit_length")().cast<int64_t>() > mostDigits * bitsOfDigit) {
+    throw py::value_error("an int of so many digits is out of the range of xs:integer");
   }
   return valueOrRaise(
       XQueryMakeFromText(XQueryItemType::Integer, digitsOf(known().decimal(object))));
@@ -36,6 +39,12 @@ Value integerFromPython(py::handle object) {
 Value decimalFromPython(py::handle object) {
   if (!object.attr("is_finite")().cast<bool>()) {
     throw py::value_error("xs:decimal has no " + fromStr(py::str(object)));
+  }
+  if (!object.attr("__bool__")().cast<bool>()) return valueOrRaise(XQueryMakeDecimal("0"));
+  const auto exponent = object.attr("adjusted")().cast<int64_t>();
+  if (exponent >= mostDigits || exponent < -mostDigits) {
+    throw py::value_error("a Decimal of the exponent " + std::to_string(exponent) +
+                          " is out of the range of xs:decimal");
   }
   return valueOrRaise(XQueryMakeDecimal(digitsOf(object)));
 }
@@ -64,8 +73,7 @@ Value textFromPython(py::handle object) {
 }
 
 Value bytesFromPython(py::handle object) {
-  const py::bytes bytes = py::reinterpret_steal<py::bytes>(PyBytes_FromObject(object.ptr()));
-  if (!bytes) throw py::error_already_set();
+  const py::bytes bytes = steal(PyBytes_FromObject(object.ptr()));
   const auto view = static_cast<std::string_view>(bytes);
   return py::isinstance(object, known().hexBinary) ? XQueryMakeHexBinary(view)
                                                    : XQueryMakeBase64Binary(view);
@@ -136,13 +144,13 @@ Value fromPython(py::handle object) {
   return otherFromPython(object);
 }
 
-XQueryVariables constantsFrom(const py::dict& variables) {
-  XQueryVariables constants;
-  for (const auto& [name, value] : variables) {
+XQueryVariables variablesFrom(const py::dict& given) {
+  XQueryVariables variables;
+  for (const auto& [name, value] : given) {
     if (!PyUnicode_Check(name.ptr())) throw py::type_error("the name of a variable is a str");
-    constants.insert_or_assign(fromStr(name), fromPython(value));
+    variables.insert_or_assign(fromStr(name), fromPython(value));
   }
-  return constants;
+  return variables;
 }
 
 }  // namespace xquery::python

@@ -17,7 +17,7 @@ py::object integerToPython(const Value& value) {
   if (const auto small = XQueryReadInteger(value)) return py::int_(*small);
   const auto digits = XQueryReadDecimal(value);
   const py::object decimal = decimalToPython(digits ? *digits : XQueryItemStringValue(*value));
-  return py::reinterpret_steal<py::object>(PyNumber_Long(decimal.ptr()));
+  return steal(PyNumber_Long(decimal.ptr()));
 }
 
 py::object numberToPython(const Value& value, XQueryItemType type) {

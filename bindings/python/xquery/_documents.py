@@ -4,17 +4,15 @@ from __future__ import annotations
 
 import os
 import re
-from typing import TYPE_CHECKING, Optional, Protocol, Union
+from typing import TYPE_CHECKING, List, Optional, Protocol, Union
 
 from . import _xquery
 from ._errors import DocumentError
-from ._settings import Loader, Policy, Settings
+from ._settings import Loader, Policy, Resource, Settings
 from ._xquery import Node
 
 if TYPE_CHECKING:
     from ._queries import Query
-
-__all__ = ["Readable", "Source", "parse"]
 
 
 class Readable(Protocol):
@@ -79,6 +77,12 @@ def _from_file(
     return document
 
 
+def _is_html(url: str, mime_type: Optional[str]) -> bool:
+    if mime_type is not None:
+        return mime_type.lower() == "text/html"
+    return url.lower().split("?")[0].endswith((".html", ".htm"))
+
+
 def _from_url(
     url: str,
     policy: Policy,
@@ -89,8 +93,17 @@ def _from_url(
 ) -> Node:
     from ._queries import _fetched
 
-    data = _fetched(url, Settings(policy=policy, loader=loader))
-    is_html = html or url.lower().split("?")[0].endswith((".html", ".htm"))
+    told: List[Optional[str]] = []
+
+    def noting(url: str, purpose: str) -> Union[None, bytes, str, Resource]:
+        assert loader is not None
+        answer = loader(url, purpose)
+        told.append(getattr(answer, "mime_type", None))
+        return answer
+
+    asked = None if loader is None else noting
+    data = _fetched(url, Settings(policy=policy, loader=asked))
+    is_html = html or _is_html(url, told[-1] if told else None)
     document = _from_bytes(data, url, is_html, strip_space, query)
     _xquery.set_uri(document, url)
     return document
@@ -116,7 +129,9 @@ def parse(
     >>> xquery.parse(b"<a>text</a>").text
     'text'
 
-    - html: the document is HTML of any quality; elements are in the XHTML namespace
+    - html: the document is HTML of any quality; elements are in the XHTML namespace. What is
+      fetched from a URL is, where a loader says so by ``Resource.mime_type`` or, where none says
+      anything, the path of the URL ends in ``.html`` or ``.htm``
     - strip_space: texts of nothing but white space are left out, unless xml:space says preserve
     - policy, loader: for a URL alone, what may be fetched and by whom
     - query: the document is for that query alone, so that no more than it needs is made

@@ -2,17 +2,9 @@
 
 from __future__ import annotations
 
+import sys
+import warnings
 from typing import Any, Dict, List, NamedTuple, Optional, Tuple, Type
-
-__all__ = [
-    "Call",
-    "CompileError",
-    "DocumentError",
-    "Error",
-    "LimitError",
-    "MissingDocumentWarning",
-    "Place",
-]
 
 
 class Place(NamedTuple):
@@ -157,6 +149,16 @@ class DocumentError(Error):
 
 class MissingDocumentWarning(UserWarning):
     """A document that a query named is missing, malformed or forbidden; the query goes on."""
+
+
+def _warn_of_missing(url: str, reason: str) -> None:
+    """Warns where the package was called, however many of its own calls lie between."""
+    level = 2
+    frame = sys._getframe().f_back
+    while frame is not None and frame.f_globals.get("__package__") == __package__:
+        frame = frame.f_back
+        level += 1
+    warnings.warn(f"{url}: {reason}", MissingDocumentWarning, stacklevel=level)
 
 
 def _restored(error: Type[Error], fields: Dict[str, Any]) -> Error:

@@ -7,8 +7,6 @@ from typing import Any
 from . import _xquery
 from ._xquery import Node
 
-__all__ = ["from_lxml", "to_lxml"]
-
 
 def from_lxml(tree: Any) -> Node:
     """A copy of a tree of lxml: of an ElementTree a document, of an element an element by itself.

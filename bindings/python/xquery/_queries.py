@@ -26,8 +26,6 @@ from ._errors import DocumentError, Error
 from ._settings import Loader, Missing, Modules, Policy, Settings, Trace
 from ._xquery import Cancellation, Node, Result
 
-__all__ = ["CheckWarning", "Context", "Function", "Profile", "Query", "Stream"]
-
 #: What can be given for a variable: see docs/python.md.
 Variables = Mapping[str, Any]
 

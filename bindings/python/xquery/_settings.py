@@ -19,8 +19,6 @@ from typing import (
 from . import _xquery
 from ._xquery import Cancellation, Result
 
-__all__ = ["Loader", "Policy", "Resource"]
-
 
 @dataclass(frozen=True)
 class Policy:

@@ -16,24 +16,6 @@ import datetime
 from dataclasses import dataclass
 from typing import ClassVar, Optional
 
-__all__ = [
-    "Date",
-    "DateTime",
-    "Duration",
-    "GDay",
-    "GMonth",
-    "GMonthDay",
-    "GYear",
-    "GYearMonth",
-    "HexBinary",
-    "MonthDuration",
-    "Notation",
-    "QName",
-    "Time",
-    "URI",
-    "Untyped",
-]
-
 
 class URI(str):
     """An xs:anyURI: a str that is a URI reference."""
@@ -112,9 +94,11 @@ def _year(year: int) -> str:
 
 
 def _zone(tzinfo: Optional[datetime.tzinfo]) -> str:
-    offset = None if tzinfo is None else tzinfo.utcoffset(None)
-    if offset is None:
+    if tzinfo is None:
         return ""
+    offset = tzinfo.utcoffset(None)
+    if offset is None:
+        raise ValueError(f"{tzinfo} has no offset from UTC without a day and a time")
     minutes, rest = divmod(offset, datetime.timedelta(minutes=1))
     if rest:
         raise ValueError(f"an offset from UTC is of whole minutes: {offset}")
