@@ -49,6 +49,9 @@ constexpr std::array rules = {
                XQueryCompareConstants},
     XQueryRule{"conditions", "several conditions on a node are asked of it as it is",
                XQueryJoinConditions},
+    // Behind what asks conditions of nodes as they are.
+    XQueryRule{"stretches", "of nodes in order those below another one are found where they begin",
+               XQueryTakeStretches},
     XQueryRule{"short paths", "what a few steps find from one node is taken as it comes",
                XQueryShortenPaths},
     XQueryRule{"operands", "arithmetic and comparisons of numbers and texts make no values between",

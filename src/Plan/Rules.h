@@ -45,6 +45,7 @@ void XQueryTakeOneByOne(XQueryPlanning& planning);
 void XQueryFindPositions(XQueryPlanning& planning);
 void XQueryAskMembers(XQueryPlanning& planning);
 void XQueryFindNearbyNodes(XQueryPlanning& planning);
+void XQueryTakeStretches(XQueryPlanning& planning);
 void XQueryCompareConstants(XQueryPlanning& planning);
 void XQueryShortenPaths(XQueryPlanning& planning);
 void XQueryAnswerQuickly(XQueryPlanning& planning);

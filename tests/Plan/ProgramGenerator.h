@@ -89,6 +89,10 @@ class ProgramGenerator {
   std::string counted(int depth);
   // Of which the first items are asked for: of a path, or of what is sorted.
   std::string first(int depth);
+  // Clauses behind which a condition asks for what an earlier one has set.
+  std::string filtered(int depth);
+  // Of a list what lies below a node.
+  std::string stretch();
   // Clauses that are joined through another one.
   std::string chain();
   // What has come up before in a list.

@@ -88,6 +88,8 @@ std::string ProgramGenerator::joined(int depth) {
   if (_random.below(6) == 0) return first(depth);
   if (_random.below(5) == 0) return conditional(depth);
   if (_random.below(5) == 0) return chain();
+  if (_random.below(6) == 0) return filtered(depth);
+  if (_random.below(8) == 0) return stretch();
   if (_random.below(6) == 0) return earlier();
   if (_random.below(8) == 0) return positions();
   std::string text = "for $u in " + many() + " ";
@@ -211,6 +213,33 @@ std::string ProgramGenerator::chain() {
     text += conditions[left - 1] + (left > 1 ? " and " : "");
   }
   return text + " return " + _random.oneOf({"$u", "$z", "<b>{$u, $z}</b>"}) + ")";
+}
+
+std::string ProgramGenerator::filtered(int depth) {
+  const std::string clause =
+      _random.oneOf({"for $v in $u/*", "for $v in $u/@*", "let $v := $u/@x", "for $v at $n in //b",
+                     "let $v := $u/* for $n in $v", "for $v in (1, 'u')", "for $v in $u/.."});
+  const auto condition = [&] {
+    if (_random.below(5) == 0) return match(_random.oneOf({"$u", "$v"}));
+    return _random.oneOf({"$u/@x = 'u'", "$u/@y", "not($u/*)", "$v = '1'", "exists($u/c)",
+                          "$u/@x = $v", "$u/.. is $v/..", "$u/@x = string($o/@x)", "$u/@x > 1",
+                          "count($u/*) > 1", "(some $w in $u/* satisfies $w = '2')"});
+  };
+  std::string text = "(for $u in " + _random.oneOf({"//a", "//b", "/a/*", many()}) + " " + clause;
+  return text + within("$u", [&] {
+           std::string rest = " where " + condition();
+           while (_random.below(3)) rest += " and " + condition();
+           return rest + " return " + _random.oneOf({"$v", "<b>{$u}</b>", expr(depth - 1)}) + ")";
+         });
+}
+
+std::string ProgramGenerator::stretch() {
+  const std::string list = _random.oneOf({"//*", "//*/@x", "(//a | //b)", "//node()", many()});
+  const std::string up = _random.oneOf({"ancestor::a", "ancestor-or-self::*", "..", "../..",
+                                        "ancestor::node()", "ancestor-or-self::b"});
+  const std::string node = _random.oneOf({variable(), "$o", "$l"});
+  return "(let $l := " + list + " return $l[" + _random.oneOf({"", "", "@x and "}) + "(" + up +
+         " intersect " + node + ")]" + _random.oneOf({"", "[@y]", "[last()]", "/..", "[2]"}) + ")";
 }
 
 std::string ProgramGenerator::earlier() {

@@ -34,6 +34,10 @@ class XQueryNearbyNode : public XQueryPlannedExpr, private XQueryNodeQuestion {
 
  private:
   std::optional<bool> holdsFor(NSXMLNode* node, const XQueryContext& context) const override;
+  bool asksForNodeAbove() const override { return _walk.goesUpOnly(); }
+  const NSXMLNode* nodeAbove(const XQueryContext& context) const override {
+    return asksForNodeAbove() ? wantedIn(context) : nullptr;
+  }
   // Null unless the variable holds one node.
   const NSXMLNode* wantedIn(const XQueryContext& context) const;
   bool finds(const NSXMLNode* wanted, NSXMLNode* start) const;

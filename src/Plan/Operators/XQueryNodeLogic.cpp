@@ -13,6 +13,14 @@ std::optional<bool> XQueryNodeLogic::holdsFor(NSXMLNode* node, const XQueryConte
   return _operands.back()->nodeQuestion()->holdsFor(node, context);
 }
 
+const XQueryNodeQuestion* XQueryNodeLogic::questionOfNodeAbove() const {
+  if (_joint != Joint::And) return nullptr;
+  for (const auto& operand : _operands) {
+    if (operand->nodeQuestion()->asksForNodeAbove()) return operand->nodeQuestion();
+  }
+  return nullptr;
+}
+
 Value XQueryNodeLogic::computeValue(XQueryContext& context) const {
   auto* node = dyn_cast<NSXMLNode>(_internal(context).contextItem());
   const auto answer = node ? holdsFor(node, context) : std::nullopt;

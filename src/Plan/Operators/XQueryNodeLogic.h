@@ -33,6 +33,13 @@ class XQueryNodeLogic : public XQueryPlannedExpr, private XQueryNodeQuestion {
 
  private:
   std::optional<bool> holdsFor(NSXMLNode* node, const XQueryContext& context) const override;
+  bool asksForNodeAbove() const override { return questionOfNodeAbove() != nullptr; }
+  const NSXMLNode* nodeAbove(const XQueryContext& context) const override {
+    const XQueryNodeQuestion* question = questionOfNodeAbove();
+    return question ? question->nodeAbove(context) : nullptr;
+  }
+  // Of those that have to hold.
+  const XQueryNodeQuestion* questionOfNodeAbove() const;
 
   const Joint _joint;
   const std::vector<Ref<XQueryPlannedExpr>> _operands;

@@ -14,6 +14,10 @@ class XQueryNodeQuestion {
   // The truth of an expression with the node for its context item; none where only evaluating it
   // tells. Nothing is left behind.
   virtual std::optional<bool> holdsFor(NSXMLNode* node, const XQueryContext& context) const = 0;
+  // Whether there may be a node in whose subtree all those lie for which it holds.
+  virtual bool asksForNodeAbove() const { return false; }
+  // That node; null where it is not known.
+  virtual const NSXMLNode* nodeAbove(const XQueryContext&) const { return nullptr; }
 
  protected:
   ~XQueryNodeQuestion() = default;

@@ -13,6 +13,7 @@
 #include "Expr/Paths/XQueryPathRun.h"
 #include "xquery/XMLNode.h"
 
+#include <algorithm>
 #include <array>
 #include <cstddef>
 #include <cstdint>
@@ -58,6 +59,12 @@ class XQueryShortWalk {
   }
   // Whether the nodes come in the order in which the path answers them.
   bool visitsInOrder() const { return _count <= 1 || !goesUp(_steps[0].axis); }
+  // Whether it finds nothing but nodes above the start, or the start.
+  bool goesUpOnly() const {
+    return std::all_of(_steps.begin(), _steps.begin() + _count, [](const Step& step) {
+      return goesUp(step.axis) || step.axis == XQueryAxisParent;
+    });
+  }
   // Visits what there is from the start on, until the visitor answers false.
   template <class Visit>
   void visit(NSXMLNode* start, Visit visit) const {

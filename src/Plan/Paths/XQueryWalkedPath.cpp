@@ -7,6 +7,8 @@
 #include "Plan/Operators/XQueryNodeQuestion.h"
 #include "Plan/Paths/XQueryPathGivers.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/Arena.h"
+#include "Platform/Tree/TreeHead.h"
 
 #include <algorithm>
 #include <iterator>
@@ -23,15 +25,45 @@ bool isKeptByAll(const XQueryStep& step, size_t firstPredicate, NSObject* item, 
                      });
 }
 
+// Of some items those from one to before another.
+struct Stretch {
+  size_t first;
+  size_t end;
+};
+
+// Of nodes in document order and of one tree those in the subtree of a node, and perhaps others.
+Stretch stretchBelow(const NSXMLNode* node, const XQueryItemList& list) {
+  constexpr size_t fewNodes = 16;
+  const auto nodeAt = [&list](size_t i) { return cast<NSXMLNode>(list[i]); };
+  const bool isOpen =
+      node && list.count() > fewNodes && NSXMLNodeOrder::areComparable(node, nodeAt(0));
+  if (!isOpen) return {0, list.count()};
+  const auto firstFrom = [&](const NSXMLNode* bound) {
+    size_t first = 0;
+    size_t end = list.count();
+    while (first < end) {
+      const size_t middle = first + (end - first) / 2;
+      const bool isBefore =
+          NSXMLNodeOrder::number(*nodeAt(middle)) < NSXMLNodeOrder::number(*bound);
+      (isBefore ? first : end) = isBefore ? middle + 1 : middle;
+    }
+    return first;
+  };
+  const NSXMLNode* stop = NSXMLTree::endOfSubtree(node);
+  return {firstFrom(node), stop ? firstFrom(stop) : list.count()};
+}
+
 // As a step filters its items, which asks all of them by evaluating the predicate.
 Value keptItems(const Value& items, const XQueryExpr& predicate, const XQueryNodeQuestion& question,
-                XQueryContext& context) {
+                bool areInOrder, XQueryContext& context) {
   auto& dynamic = _internal(context);
   const XQueryItemList list(items.get());
   dynamic.setLast(static_cast<int64_t>(list.count()));
   XQueryGatherer kept;
   WorkPacer pacer;
-  for (size_t i = 0; i < list.count(); ++i) {
+  const Stretch asked =
+      areInOrder ? stretchBelow(question.nodeAbove(context), list) : Stretch{0, list.count()};
+  for (size_t i = asked.first; i < asked.end; ++i) {
     pacer.turn();
     auto* node = dyn_cast<NSXMLNode>(list[i]);
     const auto answer = node ? question.holdsFor(node, context) : std::nullopt;
@@ -42,6 +74,9 @@ Value keptItems(const Value& items, const XQueryExpr& predicate, const XQueryNod
       return {};
     }
     if (answer && i + 1 == list.count()) dynamic.setContextItem(node, position);
+  }
+  if (asked.end < list.count()) {
+    dynamic.setContextItem(list[list.count() - 1], static_cast<int64_t>(list.count()));
   }
   return kept.value();
 }
@@ -315,7 +350,7 @@ Value XQueryWalkedPath::evaluateStart(XQueryContext& context,
     const auto* question =
         _start->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicate.get());
     if (!question) break;
-    items = keptItems(items, *predicate, *question, context);
+    items = keptItems(items, *predicate, *question, _isStartInOrder, context);
     if (XQueryHasFailed(items, context)) return {};
     ++index;
   }

@@ -88,6 +88,8 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   // That of the start.
   XQueryFromBack& startFromBack() { return _startFromBack; }
   XQueryPositionRange& startRange() { return _startRange; }
+  // The items of the start are nodes in document order, and of one tree.
+  void noteStartInOrder() { _isStartInOrder = true; }
   void setFindings(const Findings& findings) {
     _trailCount = findings.trailCount;
     _countsNodes = findings.countsNodes;
@@ -116,6 +118,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   const XQueryStep* _start = nullptr;
   XQueryFromBack _startFromBack;
   XQueryPositionRange _startRange;
+  bool _isStartInOrder = false;
   std::vector<XQueryWalkedStep> _steps;
   bool _hasPredicates = false;
   std::unique_ptr<const XQueryPicker> _picker;
