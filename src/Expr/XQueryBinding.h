@@ -11,6 +11,7 @@
 
 #include <memory>
 #include <utility>
+#include <vector>
 
 namespace xquery {
 
@@ -48,6 +49,11 @@ class XQueryBindingExpr : public XQueryExpr {
   const XQueryItemGiver* giver() const { return _giver.get(); }
   void setGiver(std::unique_ptr<const XQueryItemGiver> giver) { _giver = std::move(giver); }
 
+  // Of a clause of a FLWOR: what must hold for its variable, or the clauses behind it are not
+  // evaluated.
+  const std::vector<Ref<XQueryExpr>>& conditions() const { return _conditions; }
+  void addCondition(Ref<XQueryExpr> condition) { _conditions.push_back(std::move(condition)); }
+
   // The value that the variable takes, or what a case answers.
   Value computeValue(XQueryContext& context) const override;
   void visitParts(XQueryPartVisitor& visitor) override;
@@ -74,6 +80,7 @@ class XQueryBindingExpr : public XQueryExpr {
  private:
   std::unique_ptr<const XQueryPicker> _picker;
   std::unique_ptr<const XQueryItemGiver> _giver;
+  std::vector<Ref<XQueryExpr>> _conditions;
 };
 
 }  // namespace xquery

@@ -69,6 +69,9 @@ constexpr std::array rules = {
                XQueryJoinQuantifiers},
     XQueryRule{"step-joins", "a predicate picks the items of its step by their keys",
                XQueryJoinSteps},
+    // Behind the joins, which evaluate what conditions consist of.
+    XQueryRule{"early conditions", "a condition is asked as soon as what it reads is there",
+               XQueryAskEarly},
 };
 
 }  // namespace

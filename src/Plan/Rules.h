@@ -52,5 +52,6 @@ void XQueryAnswerQuickly(XQueryPlanning& planning);
 void XQueryBuildInPlace(XQueryPlanning& planning);
 void XQueryJoinConditions(XQueryPlanning& planning);
 void XQueryLookUpValues(XQueryPlanning& planning);
+void XQueryAskEarly(XQueryPlanning& planning);
 
 }  // namespace xquery

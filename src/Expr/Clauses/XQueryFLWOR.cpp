@@ -136,6 +136,17 @@ bool XQueryFLWORExpr::isOfType(const XQueryBindingExpr& clause, const NSObject* 
   return false;
 }
 
+// Whether a condition that is asked behind the clause does not hold, or was not answered.
+bool XQueryFLWORExpr::dropsTuple(const XQueryBindingExpr& clause, XQueryContext& context) {
+  if (clause.conditions().empty() || _internal(context).showsErrors()) return false;
+  for (const auto& condition : clause.conditions()) {
+    const Value holds = condition->evaluateWithContext(context);
+    if (XQueryHasFailed(holds, context)) return true;
+    if (XQueryEffectiveBooleanValue(holds, context) == NSNumber::falseValue()) return true;
+  }
+  return false;
+}
+
 bool XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toResults,
                                          XQueryContext& withContext) const {
   XQueryCheckStack(withContext);
@@ -148,6 +159,7 @@ bool XQueryFLWORExpr::evaluateStartingAt(size_t clause, XQueryFLWORResults& toRe
     if (XQueryHasFailed(value, withContext)) return false;
     if (!isOfType(binding, value.get(), withContext)) return false;
     _internal(withContext).setVariable(std::move(value), binding.varID());
+    if (dropsTuple(binding, withContext)) return !_internal(withContext).isFailing();
   }
   return _forLet.empty() || processItem(toResults, withContext);
 }
@@ -179,6 +191,7 @@ bool XQueryFLWORExpr::evaluateItem(const XQueryForExpr& clause, size_t index, Va
   checkWork();
   if (!isOfType(clause, item.get(), withContext)) return false;
   setTuple(clause, std::move(item), position, withContext);
+  if (dropsTuple(clause, withContext)) return !_internal(withContext).isFailing();
   return index + 1 == _forLet.size() ? processItem(toResults, withContext)
                                      : evaluateStartingAt(index + 1, toResults, withContext);
 }
@@ -235,6 +248,10 @@ bool XQueryFLWORExpr::evaluatePicks(const XQueryForExpr& clause, size_t index,
   for (const XQueryPick& pick : picks.chosen) {
     checkWork();
     setTuple(clause, items[pick.position], pick.position, withContext);
+    if (dropsTuple(clause, withContext)) {
+      if (_internal(withContext).isFailing()) return false;
+      continue;
+    }
     const bool goesOn = !isLast       ? evaluateStartingAt(index + 1, toResults, withContext)
                         : pick.isSure ? addTuple(sureReturn, toResults, withContext)
                                       : processItem(toResults, withContext);

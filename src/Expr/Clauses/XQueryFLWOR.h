@@ -156,6 +156,7 @@ class XQueryFLWORExpr : public XQueryExpr {
   bool addSortItems(Value value, XQuerySortList& toList, XQueryContext& context) const;
   bool isOfType(const XQueryBindingExpr& clause, const NSObject* value,
                 XQueryContext& context) const;
+  static bool dropsTuple(const XQueryBindingExpr& clause, XQueryContext& context);
 
   bool evaluatePicks(const XQueryForExpr& clause, size_t index, const XQueryPicks& picks,
                      XQueryFLWORResults& toResults, XQueryContext& withContext) const;
