@@ -24,7 +24,7 @@ void readHeader(QueryCase& c, std::string header, std::string& section, std::str
   name = header;
   if (section == "var") {
     const std::string variable = takeUpTo(header, '=');
-    c.constants[variable] = XQueryUntypedAtomic(header);
+    c.constants[variable] = NSString::stringWithUTF8(header);
   } else if (section == "namespace") {
     const std::string prefix = takeUpTo(header, '=');
     c.namespaces[prefix] = header;
