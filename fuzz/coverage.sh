@@ -35,20 +35,20 @@ llvm-profdata merge -sparse "$out"/*.profraw -o "$out/all.profdata" || exit 1
 llvm-cov export -format=lcov "${objects[@]:1}" -instr-profile="$out/all.profdata" "$top/src" \
   >"$out/all.lcov" || exit 1
 
-awk -v top="$top/src/" -v unreached="$out/unreached.txt" '
+# A compiler cache makes paths relative to the folder of the build.
+awk -v unreached="$out/unreached.txt" '
   function room(file) {
-    sub(top, "", file)
     count = split(file, parts, "/")
     return parts[1] == "Platform" && count > 2 ? parts[1] "/" parts[2] : parts[1]
   }
   BEGIN { FS = "[:,]"; printf "" > unreached }
-  $1 == "SF" { file = $2; name = room(file) }
-  $1 == "DA" {
+  $1 == "SF" { file = $2; name = sub(/^.*\/src\//, "", file) ? room(file) : "" }
+  name && $1 == "DA" {
     lines[name]++
     if ($3 > 0) reached[name]++
-    else print substr(file, length(top) + 1) ":" $2 > unreached
+    else print file ":" $2 > unreached
   }
-  $1 == "BRDA" { branches[name]++; if ($5 != "-" && $5 > 0) taken[name]++ }
+  name && $1 == "BRDA" { branches[name]++; if ($5 != "-" && $5 > 0) taken[name]++ }
   END {
     print "| room | lines | reached | branches | taken |"
     print "|---|---|---|---|---|"
