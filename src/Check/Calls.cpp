@@ -70,8 +70,12 @@ void lookAtCollection(XQueryChecking& checking, XQueryPlaceID call, std::string_
 void lookAtExtreme(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
   const XQueryPlaceID items = checking.argument(call, 0);
   const XQueryFacts& facts = checking.factsOf(items);
+  const bool adds = name == "sum" || name == "avg";
   if (facts.most > 0 && facts.are(URI)) {
     checking.warn(call, ID::AggregateOfURIs, {std::string(name)});
+  } else if (adds && facts.most > 0 && facts.are(DateTime | Date | Time)) {
+    checking.warn(call, ID::CallDiffers,
+                  {std::string(name) + " of a date or time", "of one alone it is that one"});
   } else if (checking.givesUntypedText(items)) {
     checking.warn(
         call, ID::UntypedText,
@@ -146,6 +150,66 @@ void lookAtDistinct(XQueryChecking& checking, XQueryPlaceID call, std::string_vi
                 {std::string(name) + " of truth values and numbers", "true equals 1, false 0"});
 }
 
+// Of the two ordered durations there are only their own parts.
+void lookAtDurationPart(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
+  const bool isOfMonths = name.starts_with("years") || name.starts_with("months");
+  const XQueryItemKinds other = isOfMonths ? DayTimeDuration : YearMonthDuration;
+  const XQueryFacts& facts = checking.factsOf(checking.argument(call, 0));
+  if (facts.most == 0 || !facts.are(other)) return;
+  checking.warn(
+      call, ID::CallDiffers,
+      {std::string(name) + (isOfMonths ? " of a dayTimeDuration" : " of a yearMonthDuration"),
+       "it fails, and is not 0"});
+}
+
+void lookAtDocument(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* location = checking.textIn(checking.argument(call, 0));
+  if (!location || location->length() > 0) return;
+  checking.warn(call, ID::CallDiffers,
+                {"doc of the empty text", "it gives nothing, and not what is at the base URI"});
+}
+
+// Lengths and positions count UTF-16 units.
+void lookAtUnits(XQueryChecking& checking, XQueryPlaceID call, std::string_view name) {
+  const auto* text = checking.textIn(checking.argument(call, 0));
+  const auto isHalf = [](char16_t unit) { return (unit & 0xF800) == 0xD800; };
+  uint32_t i = 0;
+  while (text && i < text->length() && !isHalf(text->view()[i])) ++i;
+  if (!text || i == text->length()) return;
+  checking.warn(call, ID::CallDiffers,
+                {std::string(name) + " with a character beyond U+FFFF", "it counts as two"});
+}
+
+void lookAtCodepoints(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* code = dyn_cast<NSNumber>(checking.literalIn(checking.argument(call, 0)));
+  if (!code || code->doubleValue() != 0) return;
+  checking.warn(call, ID::CallDiffers,
+                {"codepoints-to-string of 0", "it gives U+0000, and not an error"});
+}
+
+void lookAtAbs(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* made = checking.inside<XQueryFunctionCall>(checking.argument(call, 0));
+  if (!made || !made->builtIn()) return;
+  const auto& row = made->builtIn()->row();
+  if (row.namespaceID != XQueryNamespaceXS || row.localName != "negativeInteger") return;
+  checking.warn(call, ID::CallDiffers, {"abs of xs:negativeInteger", "it fails, use xs:integer()"});
+}
+
+// In no namespace a name has no prefix, and no name holds white space.
+void lookAtQName(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* URI = checking.literalIn(checking.argument(call, 0));
+  const auto* URIText = dyn_cast<NSString>(URI);
+  const auto* name = checking.textIn(checking.argument(call, 1));
+  if (!name) return;
+  const bool isNowhere = URI && (URI->kind() == Kind::Null || (URIText && URIText->length() == 0));
+  const std::string written = name->utf8();
+  const bool isWrong = written.empty() || written.find_first_of(" \t\r\n") != written.npos;
+  if (!isWrong && !(isNowhere && written.find(':') != written.npos)) return;
+  checking.warn(
+      call, ID::CallDiffers,
+      {"QName of " + checking.labelOf(checking.argument(call, 1)), "the name is not checked"});
+}
+
 void lookAtNormalForm(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
   const auto* text = checking.textIn(checking.argument(call, 1));
   if (!text || text->length() == 0) return;
@@ -153,6 +217,58 @@ void lookAtNormalForm(XQueryChecking& checking, XQueryPlaceID call, std::string_
   const std::string written = text->utf8();
   if (std::find(forms.begin(), forms.end(), written) != forms.end()) return;
   checking.warn(call, ID::NormalForm, {checking.labelOf(checking.argument(call, 1))});
+}
+
+// The groups of a pattern that take what they match.
+size_t groupsIn(std::string_view pattern) {
+  size_t count = 0;
+  bool isInClass = false;
+  for (size_t i = 0; i < pattern.size(); ++i) {
+    if (pattern[i] == '\\') {
+      ++i;
+    } else if (pattern[i] == '[') {
+      isInClass = true;
+    } else if (pattern[i] == ']') {
+      isInClass = false;
+    } else if (pattern[i] == '(' && !isInClass && !pattern.substr(i + 1).starts_with('?')) {
+      ++count;
+    }
+  }
+  return count;
+}
+
+// "$11" is the eleventh group in XQuery 1.0 where there are so many, and else, as it always is
+// here, the first group and a 1.
+std::string longReferenceIn(std::string_view replacement, size_t groups) {
+  const auto isDigit = [&](size_t i) {
+    return i < replacement.size() && replacement[i] >= '0' && replacement[i] <= '9';
+  };
+  for (size_t i = 0; i < replacement.size(); ++i) {
+    if (replacement[i] == '\\') {
+      ++i;
+    } else if (replacement[i] == '$' && isDigit(i + 1) && isDigit(i + 2)) {
+      const auto number = static_cast<size_t>(replacement[i + 1] - '0') * 10 +
+                          static_cast<size_t>(replacement[i + 2] - '0');
+      if (number > 9 && number <= groups) return std::string(replacement.substr(i, 3));
+    }
+  }
+  return {};
+}
+
+void lookAtReplacement(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* pattern = checking.textIn(checking.argument(call, 1));
+  const auto* replacement = checking.textIn(checking.argument(call, 2));
+  if (!pattern || !replacement) return;
+  const std::string found = longReferenceIn(replacement->utf8(), groupsIn(pattern->utf8()));
+  if (found.empty()) return;
+  checking.warn(call, ID::CallDiffers,
+                {"replace with " + found, "it is group " + found.substr(1, 1) + " and a digit"});
+}
+
+void lookAtTokens(XQueryChecking& checking, XQueryPlaceID call, std::string_view) {
+  const auto* text = checking.textIn(checking.argument(call, 0));
+  if (!text || text->length() > 0) return;
+  checking.warn(call, ID::CallDiffers, {"tokenize of the empty text", "it gives one token"});
 }
 
 // The first construct of a pattern that Perl reads otherwise; empty for none.
@@ -298,9 +414,23 @@ constexpr auto rows = std::to_array<Row>({
     {"distinct-values", lookAtDistinct},
     {"lang", lookAtLang},
     {"normalize-unicode", lookAtNormalForm},
+    {"years-from-duration", lookAtDurationPart},
+    {"months-from-duration", lookAtDurationPart},
+    {"days-from-duration", lookAtDurationPart},
+    {"hours-from-duration", lookAtDurationPart},
+    {"minutes-from-duration", lookAtDurationPart},
+    {"seconds-from-duration", lookAtDurationPart},
+    {"doc", lookAtDocument},
+    {"string-length", lookAtUnits},
+    {"substring", lookAtUnits},
+    {"codepoints-to-string", lookAtCodepoints},
+    {"abs", lookAtAbs},
+    {"QName", lookAtQName},
     {"matches", lookAtPattern},
     {"replace", lookAtPattern},
     {"tokenize", lookAtPattern},
+    {"replace", lookAtReplacement},
+    {"tokenize", lookAtTokens},
     {"position", lookAtPosition},
     {"last", lookAtPosition},
 });

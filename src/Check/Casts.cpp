@@ -6,11 +6,13 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Constructors/XQueryElementContentString.h"
 #include "Expr/TypeTests/XQueryTypeExprs.h"
+#include "Expr/XQueryAsking.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQuerySequence.h"
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Labels.h"
 #include "Platform/Base/NSLog.h"
+#include "Types/XQueryAtomization.h"
 #include "Types/XQueryTypeTable.h"
 #include "xquery/Number.h"
 #include "xquery/XQuery.h"
@@ -117,6 +119,37 @@ bool isBase64(std::string_view text) {
   });
 }
 
+bool isHexadecimal(std::string_view text) {
+  text = trimmed(text);
+  return std::none_of(text.begin(), text.end(), isSpace);
+}
+
+// White space around it is dropped, and of tokens each run inside is one space.
+std::string collapsed(std::string_view text) {
+  std::string form;
+  for (const char c : trimmed(text)) {
+    if (!isSpace(c)) {
+      form += c;
+    } else if (form.back() != ' ') {
+      form += ' ';
+    }
+  }
+  return form;
+}
+
+// What is accepted here in the place of a text that XQuery 1.0 may accept as it is written.
+std::string acceptedForm(XQueryTypeID type, std::string_view text) {
+  constexpr std::string_view midnight = "24:00:00";
+  std::string form = collapsed(text);
+  if (type == XQueryTypeGMonth && form.size() >= 4 && form.substr(4, 2) != "--") {
+    form.insert(4, "--");
+  }
+  if (type == XQueryTypeNMTOKEN) std::replace(form.begin(), form.end(), ':', '.');
+  const size_t time = isTimeType(type) ? form.find(midnight) : form.npos;
+  if (time != form.npos && (time == 0 || form[time - 1] == 'T')) form.replace(time, 2, "00");
+  return form;
+}
+
 // --- casts ---------------------------------------------------------------------------------------
 
 struct Cast {
@@ -143,14 +176,32 @@ Cast castIn(const XQueryChecking& checking, XQueryPlaceID place) {
   return {XQueryTypeIDForQName(*name), call->name()->utf8(), checking.argument(place, 0)};
 }
 
-// The value of a cast of a literal; null when it fails.
-Value valueOf(const XQueryChecking& checking, XQueryPlaceID place) {
+// What a cast of a literal answers; null when it fails.
+template <class Answer>
+Value tried(Answer answer) {
   const auto context = XQueryContext::xqueryContext();
-  const Value value = normalised(checking.at(place).expr->evaluateWithContext(*context));
+  const Value value = normalised(answer(*context));
   if (!XQueryHasFailed(value, *context)) return value;
   if (_internal(*context).isFailingForGood()) _internal(*context).throwFailure();
   _internal(*context).passOverFailure(nullptr);
   return {};
+}
+
+Value valueOf(const XQueryChecking& checking, XQueryPlaceID place) {
+  return tried([&](XQueryContext& context) {
+    return checking.at(place).expr->evaluateWithContext(context);
+  });
+}
+
+// The text that a text becomes, cast to a type where the expression stands; empty when it cannot be
+// cast.
+std::string castText(const XQueryExpr& expr, const std::string& text, XQueryTypeID type) {
+  const Value value = tried([&](XQueryContext& context) {
+    return XQueryAsk(expr, context, [&] {
+      return XQueryCastObject(NSString::stringWithUTF8Replacing(text), type, context, false);
+    });
+  });
+  return value ? XQueryItemStringValue(*value) : std::string();
 }
 
 bool isNumericType(XQueryTypeID type) {
@@ -166,6 +217,8 @@ bool isAcceptedHereAlone(const Cast& cast, const NSObject& literal) {
   const auto* text = dyn_cast<NSString>(&literal);
   if (!text) return false;
   const std::string written = text->utf8();
+  if (cast.type == XQueryTypeNotation) return true;
+  if (cast.type == XQueryTypeHexBinary) return !isHexadecimal(written);
   if (cast.type == XQueryTypeLanguage) return !isLanguage(written);
   if (cast.type == XQueryTypeBase64Binary) return !isBase64(written);
   if (isNumericType(cast.type)) {
@@ -195,14 +248,72 @@ void checkName(XQueryChecking& checking, XQueryPlaceID place, const Cast& cast,
   checking.warn(place, ID::CastFails, {shown(checking, cast), cast.label});
 }
 
+// --- how values are written ----------------------------------------------------------------------
+
+// A general duration in the form that XQuery 1.0 gives it: the months and the rest as the two
+// ordered durations write them. Empty where that cannot be told.
+std::string formOfDuration(const XQueryExpr& expr, std::string_view text) {
+  const bool isNegative = text.starts_with('-');
+  if (isNegative) text.remove_prefix(1);
+  if (!text.starts_with('P')) return {};
+  const std::string_view date = text.substr(0, text.find('T'));
+  const size_t last = date.find_last_of("YM");
+  const size_t end = last == date.npos ? 1 : last + 1;
+  std::string form;
+  const auto add = [&](const std::string& part, XQueryTypeID type, std::string_view nothing) {
+    const std::string written = part == "P" ? std::string(nothing) : castText(expr, part, type);
+    if (written != nothing) form += written.substr(std::min<size_t>(written.size(), 1));
+  };
+  add(std::string(text.substr(0, end)), XQueryTypeYearMonthDuration, "P0M");
+  add("P" + std::string(text.substr(end)), XQueryTypeDayTimeDuration, "PT0S");
+  if (form.empty()) return "PT0S";
+  return (isNegative ? "-P" : "P") + form;
+}
+
+// Of a fraction of seconds all six digits are written.
+std::string formOfTime(std::string form) {
+  const size_t point = form.find('.');
+  if (point == form.npos) return form;
+  const size_t end = std::min(form.find_first_not_of("0123456789", point + 1), form.size());
+  const size_t kept = form.find_last_not_of('0', end - 1) + 1;
+  return form.erase(kept, end - kept);
+}
+
+// Where the value is compared, calculated with or taken apart, nobody sees how it is written.
+bool mayBeWritten(const XQueryChecking& checking, XQueryPlaceID place) {
+  for (int level = 0; level < XQueryChecking::mostLevels; ++level) {
+    const XQueryPlace& at = checking.at(place);
+    if (at.parent == XQueryNoPlace) return true;
+    if (at.role == XQueryRole::Argument) {
+      const std::string_view name = checking.functionCalledIn(checking.at(at.parent).parent);
+      return name == "string" || name == "concat" || name == "data";
+    }
+    if (checking.program.withoutParentheses(at.parent) != place) {
+      return checking.at(at.parent).expr->kind() != Kind::OperatorExpr;
+    }
+    place = at.parent;
+  }
+  return false;
+}
+
+void checkForm(XQueryChecking& checking, XQueryPlaceID place, const Cast& cast,
+               const NSString& text, const std::string& written) {
+  std::string form = written;
+  if (cast.type == XQueryTypeDuration) form = formOfDuration(*checking.at(place).expr, text.utf8());
+  if (isTimeType(cast.type)) form = formOfTime(written);
+  if (form.empty() || form == written || !mayBeWritten(checking, place)) return;
+  checking.warn(place, ID::WrittenOtherwise, {shown(checking, cast), written, form});
+}
+
+bool isPlain(const NSObject& literal) {
+  return literal.kind() == Kind::Null || isa<NSString>(&literal) || isa<NSNumber>(&literal);
+}
+
 void checkLiteralCast(XQueryChecking& checking, XQueryPlaceID place, const Cast& cast,
                       const NSObject& literal) {
   if (cast.type == XQueryTypeQName) return checkName(checking, place, cast, literal);
   // Diagnostics show each error as it is made.
-  if (cast.type == XQueryTypeNotation || XQueryLogEnabled()) return;
-  const bool isPlain =
-      literal.kind() == Kind::Null || isa<NSString>(&literal) || isa<NSNumber>(&literal);
-  if (!isPlain) return;
+  if (XQueryLogEnabled() || !isPlain(literal)) return;
   const Value value = valueOf(checking, place);
   if (!value) {
     checking.warn(place, ID::CastFails, {shown(checking, cast), cast.label});
@@ -217,7 +328,40 @@ void checkLiteralCast(XQueryChecking& checking, XQueryPlaceID place, const Cast&
   if (text && isDuration && hasLateFraction(text->utf8())) {
     checking.warn(place, ID::DurationFraction,
                   {shown(checking, cast), XQueryItemStringValue(*value)});
+  } else if (text) {
+    checkForm(checking, place, cast, *text, XQueryItemStringValue(*value));
   }
+}
+
+// Whether XQuery 1.0 accepts a text that is refused here.
+bool isAcceptedElsewhere(const XQueryExpr& expr, XQueryTypeID type, const std::string& text) {
+  if (type == XQueryTypeAnyURI) return true;
+  if (isNumericType(type)) return isNumberOf(type, text);
+  const std::string form = acceptedForm(type, text);
+  return form != text && !castText(expr, form, type).empty();
+}
+
+void checkLiteralCastable(XQueryChecking& checking, XQueryPlaceID place, const Cast& cast,
+                          const NSObject& literal) {
+  if (cast.type == XQueryTypeQName || XQueryLogEnabled() || !isPlain(literal)) return;
+  const Value answer = valueOf(checking, place);
+  if (!answer) return;
+  const auto* text = dyn_cast<NSString>(&literal);
+  if (!XQueryIsTrue(answer)) {
+    if (!text || !isAcceptedElsewhere(*checking.at(place).expr, cast.type, text->utf8())) return;
+    checking.warn(place, ID::CastableRefused, {shown(checking, cast), cast.label});
+  } else if (!checkNumber(checking, place, cast, &literal) && isAcceptedHereAlone(cast, literal)) {
+    checking.warn(place, ID::CastAccepts, {shown(checking, cast), cast.label});
+  }
+}
+
+// A QName becomes no token; in XQuery 1.0 its text does.
+void checkCastOfName(XQueryChecking& checking, XQueryPlaceID place, const Cast& cast) {
+  const XQueryFacts& facts = checking.factsOf(cast.operand);
+  const bool isToken =
+      cast.type != XQueryTypeString && XQueryIsKindOfType(cast.type, XQueryTypeString);
+  if (!isToken || facts.most == 0 || !facts.are(QName)) return;
+  checking.warn(place, ID::CastFails, {"a QName", cast.label});
 }
 
 void checkCastable(XQueryChecking& checking, XQueryPlaceID place, const Cast& cast) {
@@ -226,8 +370,8 @@ void checkCastable(XQueryChecking& checking, XQueryPlaceID place, const Cast& ca
     checking.warn(place, ID::CastableOfSeveral);
     return;
   }
-  if (checking.literalIn(cast.operand)) {
-    checkNumber(checking, place, cast, checking.literalIn(cast.operand));
+  if (const NSObject* literal = checking.literalIn(cast.operand)) {
+    checkLiteralCastable(checking, place, cast, *literal);
   } else if (isNumericType(cast.type) && facts.most > 0 && facts.mayBe(Node | Untyped | String)) {
     checking.warn(place, ID::CastableNumber, {cast.label});
   }
@@ -242,6 +386,8 @@ void XQueryCheckCast(XQueryChecking& checking, XQueryPlaceID place) {
     checkCastable(checking, place, cast);
   } else if (const NSObject* literal = checking.literalIn(cast.operand)) {
     checkLiteralCast(checking, place, cast, *literal);
+  } else {
+    checkCastOfName(checking, place, cast);
   }
 }
 

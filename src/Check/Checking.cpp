@@ -197,7 +197,7 @@ bool XQueryChecking::hasUnknownPrefix(const NSString& name, XQueryPlaceID place)
 bool XQueryChecking::givesUntypedText(XQueryPlaceID place) const {
   if (place == XQueryNoPlace) return false;
   const std::string_view name = functionCalledIn(place);
-  return name == "concat" || name == "replace" || name == "tokenize";
+  return name == "concat" || name == "replace" || name == "tokenize" || name == "in-scope-prefixes";
 }
 
 bool XQueryChecking::mayWellBeEmpty(XQueryPlaceID place) const {

@@ -6,6 +6,7 @@
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Labels.h"
 #include "Platform/Base/WorkMeter.h"
+#include "xquery/Number.h"
 
 namespace xquery {
 namespace {
@@ -21,6 +22,7 @@ constexpr int classGeneral = 6;
 constexpr int classNode = 7;
 
 constexpr XQueryItemKinds instants = DateTime | Date | Time;
+constexpr XQueryItemKinds laterInstants = instants | Gregorian;  // on the right
 
 struct Sides {
   XQueryPlaceID left;
@@ -42,9 +44,10 @@ bool canBeCompared(XQueryItemKinds a, XQueryItemKinds b, const Sides& sides) {
   if (are(Numeric) || are(String) || are(Boolean)) return true;
   if (are(OrderedDuration)) return a == b;
   if (sides.isEquality()) return a == b && a != PlainDuration;
-  // The left side alone decides how values are ordered.
+  // The left side alone decides how values are ordered; true is 1 beside a number.
   if (a & Boolean) return true;
-  return are(instants);
+  if (a & Numeric) return (b & Boolean) != 0;
+  return (a & instants) && (b & laterInstants);
 }
 
 template <class Judge>
@@ -99,11 +102,43 @@ void checkNaN(XQueryChecking& checking, XQueryPlaceID place, const Sides& sides)
 // --- texts that are untyped ----------------------------------------------------------------------
 
 void checkUntypedText(XQueryChecking& checking, XQueryPlaceID text, XQueryPlaceID other) {
-  if (!checking.givesUntypedText(text) || other == XQueryNoPlace) return;
+  if (text == XQueryNoPlace || other == XQueryNoPlace) return;
+  // The values of these nodes are strings in XQuery 1.0.
+  const XQueryFacts& facts = checking.factsOf(text);
+  const bool areRemarks = facts.most > 0 && facts.are(Comment | Instruction);
+  if (!areRemarks && !checking.givesUntypedText(text)) return;
   const XQueryItemKinds kinds = checking.atomicKinds(other);
   if (kinds == None || (kinds & ~Numeric) != 0) return;
-  checking.warn(text, ID::UntypedText,
-                {std::string(checking.functionCalledIn(text)), "is a number beside numbers"});
+  const std::string giver =
+      areRemarks ? XQueryNameOfKinds(facts.kinds) : std::string(checking.functionCalledIn(text));
+  checking.warn(text, ID::UntypedText, {giver, "is a number beside numbers"});
+}
+
+// --- truth values and floats ---------------------------------------------------------------------
+
+// A truth value on the left is ordered with anything, one on the right with numbers. An untyped
+// value is cast to one by "<" and its like, and is a string for "lt" and its like.
+void checkTruthOrder(XQueryChecking& checking, XQueryPlaceID place, const Sides& sides,
+                     XQueryItemKinds left, XQueryItemKinds right) {
+  const XQueryItemKinds fitting = sides.isGeneral ? Boolean | Untyped : Boolean;
+  if (sides.isEquality() || (left != Boolean && right != Boolean)) return;
+  const XQueryItemKinds other = left == Boolean ? right : left;
+  if ((other & fitting) != 0) return;
+  checking.warn(place, ID::TruthOrder,
+                {XQueryLabelOf(*checking.at(place).expr), XQueryNameOfKinds(other)});
+}
+
+// As doubles a float and a decimal differ where the decimal is no float: 0.1 is none, 0.5 is one.
+void checkFloat(XQueryChecking& checking, XQueryPlaceID place, XQueryPlaceID side,
+                XQueryPlaceID other) {
+  const auto* number = dyn_cast<NSNumber>(checking.literalIn(other));
+  const XQueryItemKinds kinds = checking.atomicKinds(side);
+  const bool isFloat = (kinds & Float) != 0 && (kinds & ~(Float | Double)) == 0;
+  if (!number || !isFloat || !checking.factsOf(other).are(AnyDecimal)) return;
+  const double value = number->doubleValue();
+  if (static_cast<double>(static_cast<float>(value)) == value) return;
+  checking.warn(place, ID::FloatAsDouble,
+                {XQueryLabelOf(*checking.at(place).expr), checking.labelOf(other)});
 }
 
 // --- comparisons ---------------------------------------------------------------------------------
@@ -127,13 +162,16 @@ void checkComparison(XQueryChecking& checking, XQueryPlaceID place, const Sides&
     checkUntypedText(checking, sides.right, sides.left);
   }
   checkNaN(checking, place, sides);
+  checkFloat(checking, place, sides.left, sides.right);
+  checkFloat(checking, place, sides.right, sides.left);
   const XQueryItemKinds left = kindsOfSide(checking, sides.left);
   const XQueryItemKinds right = kindsOfSide(checking, sides.right);
   if (left == None || right == None) return;
   const bool isPossible =
       anyPair(left, right, [&](auto a, auto b) { return canBeCompared(a, b, sides); });
   if (!isPossible) return warnOfFailure(checking, place, sides, left, right);
-  const bool areInstants = ((left | right) & ~instants) == 0;
+  checkTruthOrder(checking, place, sides, left, right);
+  const bool areInstants = (left & ~instants) == 0 && (right & ~laterInstants) == 0;
   if (areInstants && (left & right) == 0) {
     checking.warn(place, ID::DateAndTime,
                   {XQueryLabelOf(*checking.at(place).expr), XQueryNameOfKinds(left),

@@ -107,6 +107,9 @@ class Steps {
     if (step.axis() == XQueryAxisSelf && (from & ~Attribute) == 0 && isNameTest(step.expr())) {
       _checking.warn(place, ID::SelfOfAttribute, {labelOf(step).substr(6)});
     }
+    if (step.axis() == XQueryAxisFollowing && (from & ~Attribute) == 0) {
+      _checking.warn(place, ID::FollowingOfAttribute);
+    }
     const XQueryItemKinds onAxis = step.axis() == XQueryAxisSelf ? from : axis.to;
     const XQueryItemKinds found = onAxis & XQueryKindsOfStep(step);
     if (found == None && !isDocumentTest(step.expr())) {

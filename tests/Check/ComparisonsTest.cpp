@@ -40,9 +40,37 @@ TEST(CheckedComparisons, OfDatesAndDurations) {
       {"xdt:yearMonthDuration('P1Y') = xdt:dayTimeDuration('P1D')", "1 duration-comparison"},
       {"xdt:yearMonthDuration('P1Y') = xdt:yearMonthDuration('P12M')", ""},
       {"current-date() lt current-time()", "1 date-and-time"},
+      {"current-date() lt xs:gYear('2004')", "1 date-and-time"},
+      {"xs:gYear('2004') lt current-date()", "1 comparison-fails"},
       {"current-date() lt xs:date(//a[1])", ""},
       {"current-date() = current-time()", "1 comparison-fails"},
   });
+}
+
+TEST(CheckedComparisons, OfTruthValuesByOrder) {
+  expectWarnings({
+      {"true() lt 1", "1 truth-order"},
+      {"exists(//a) <\n'b'", "1 truth-order"},
+      {"true() gt //a[1]", "1 truth-order"},
+      {"0 lt true(), count(//a) > false()", "1 truth-order, 1 truth-order"},
+      {"'a' lt true(), current-date() > true()", "1 comparison-fails, 1 comparison-fails"},
+      {"true() < //a or false() lt true()", ""},
+      {"true() lt number(//a[1]), true() = //a[1] and true() eq false()", "1 truth-order"},
+      {"for $x in (1, true()) return $x lt 1", ""},
+  });
+  EXPECT_EQ(textOf("true() lt 1"), "lt orders a truth value and a number");
+}
+
+// What is no float is another number as a double than as a float.
+TEST(CheckedComparisons, OfFloatsAndDecimals) {
+  expectWarnings({
+      {"xs:float(0.1) = 0.1", "1 float-as-double"},
+      {"0.3 lt (//a[1] cast as xs:float)", "1 float-as-double"},
+      {"//a[xs:float(.) > 16777217]", "1 float-as-double"},
+      {"xs:float(0.5) = 0.5, xs:float(1) lt 16777216, xs:float(0.1) = 0.1e0", ""},
+      {"xs:double(0.1) = 0.1, xs:float(0.1) = xs:float(0.1), number(//a[1]) = 0.1", ""},
+  });
+  EXPECT_EQ(textOf("xs:float(0.1) = 0.1"), "= compares a float with 0.1 as doubles");
 }
 
 TEST(CheckedComparisons, WithNaN) {
@@ -85,6 +113,10 @@ TEST(CheckedComparisons, OfTextsThatAreUntyped) {
       {"concat('1', '2') = 12", "1 untyped-text"},
       {"//a[replace(., 'x', '') > 9]", "1 untyped-text"},
       {"concat('1', '2') + 1", "1 untyped-text"},
+      {"//a[comment() = 1]", "1 untyped-text"},
+      {"1 < <?p 2?>", "1 untyped-text"},
+      {"in-scope-prefixes(/*) instance of xs:string*", "1 untyped-text"},
+      {"//a[comment() = '1'], //a[text() = 1], //a[node() = 1]", ""},
       {"concat('1', '2') = '12', concat('a', 'b') = //a/@b or //c", ""},
   });
 }
