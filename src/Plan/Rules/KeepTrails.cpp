@@ -3,10 +3,10 @@
 // Pattern     steps at the end of a path, as far to the front as what follows can be repeated: no
 //             expressions among them, no names that may raise an error
 // Facts       of predicates: whether they are repeatable, read what other steps set, ask for a
-//             position or a size, may answer a number, load documents; what they leave in variables.
-//             Of steps before an expression, at which nodes are to arrive in the same order and as
-//             often: all predicates and expressions of the path are repeatable, and none reads what
-//             another one sets
+//             position or a size, may answer a number, load documents; what they leave in
+//             variables. Of steps before an expression, at which nodes are to arrive in the same
+//             order and as often: all predicates and expressions of the path are repeatable, and
+//             none reads what another one sets
 // Operator    none: XQueryWalkedPath is told which of its shortcuts are open
 // Why         see XQueryPathWalk.h. Predicates that are asked less often, or in another order,
 //             leave other values in the variables of their quantifiers, which nobody may read
