@@ -266,7 +266,7 @@ const NSXMLValueKey someKeys[] = {
     {name("r"), {name("a"), {name("c"), true}}, {}},
     {name("a"), {}, {}, true},
     {name("r"), {name("a"), name("b")}, {}, true},
-    {name("a"), {{name("b"), true}}, {}, true},
+    {name("r"), {name("a"), {name("c"), true}}, {}, true},
 };
 
 void expectValues(const NSXMLValueIndex& index, NSXMLNode* root, const NSXMLValueKey& key) {
