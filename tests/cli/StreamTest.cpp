@@ -61,6 +61,22 @@ TEST(StreamCommand, RefusesBeforeAnythingIsRead) {
   EXPECT_EQ(xquery({"--stream", "-e", "/a/b", "/no/such/file"}).status, 3);
 }
 
+TEST(StreamCommand, RefusesPrefixesThatNobodyDeclares) {
+  const std::string query = "count(\n/z/p:b)";
+  const Outcome outcome = xquery({"--stream", "-e", query, "/no/such/file"});
+  EXPECT_EQ(outcome.status, 1);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_EQ(outcome.err,
+            "XQueryError:0 - \"cannot be evaluated as a stream: a prefix on the way to the records "
+            "is not declared\" at line:2\n  at query:2:4\n  2 | /z/p:b)\n    |    ^^^\n");
+  EXPECT_EQ(xquery({"-e", query, "-"}, text).out, "0\n");
+  const auto declared = [&](const std::string& input) {
+    return xquery({"--stream", "--namespace", "p=u", "-e", query, input}, text);
+  };
+  EXPECT_EQ(declared("-").out, "0\n");
+  EXPECT_EQ(declared("/no/such/file").status, 3);
+}
+
 TEST(StreamCommand, ShowsHowItWouldBeDone) {
   const auto plan = [](const std::string& query) {
     return xquery({"--stream", "--plan", "-e", query});

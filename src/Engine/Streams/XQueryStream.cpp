@@ -44,7 +44,7 @@ bool cannotGoBack() {
   return false;
 }
 
-// The names of the ways to the records, as the context resolves them.
+// The names of the ways to the records, as the context resolves them; it knows their prefixes.
 class RecordPaths {
  public:
   RecordPaths(const XQueryStreamProgram& program, XQueryContext& context) {
@@ -258,6 +258,8 @@ bool XQueryContext::evaluateStream(const XQuery& query, const XQueryVariables& c
     failure.error = XQueryErrors::notAStream.error("it was not compiled to be");
     return false;
   }
+  failure.error = program->refusalIn(*this, *compiled.prolog());
+  if (failure.error) return false;
   const XQueryContextInternal::UnderWay underWay(*_private);
   const NSXMLEra era;
   beginEvaluation(compiled);

@@ -14,22 +14,36 @@
 #include "Types/XQueryErrors.h"
 
 #include <algorithm>
+#include <string_view>
 #include <utility>
 
 namespace xquery {
 
 namespace {
 
-// Told like an error of compiling, so of the module in which the place is.
+// Told like an error of compiling.
+Ref<XQueryError> refusalAt(const XQueryExpr& expr, std::string_view reason,
+                           const XQueryProlog& main) {
+  return XQueryErrorTrace::error(
+      *XQueryErrors::notAStream.errorAtLine(expr.exprLine(), reason),
+      XQueryErrorTrace::traceInPlaces(main.modules().places(), expr.exprPlace()));
+}
+
+// Of the module in which the place is.
 Ref<XQueryError> refusalOf(const XQueryProgram& program, const XQueryStreamPlan& plan,
                            const XQueryProlog& main) {
-  const XQueryExpr& expr = *program[plan.refusedAt].expr;
-  const auto error = XQueryErrorTrace::error(
-      *XQueryErrors::notAStream.errorAtLine(expr.exprLine(), plan.reason),
-      XQueryErrorTrace::traceInPlaces(main.modules().places(), expr.exprPlace()));
+  const auto error = refusalAt(*program[plan.refusedAt].expr, plan.reason, main);
   const XQueryProlog* prolog = program.bodyOf(plan.refusedAt).prolog;
   if (!prolog || prolog == &main || !prolog->moduleURL()) return error;
   return XQueryError::errorInModule(*error, prolog->moduleURL()->absoluteString());
+}
+
+bool isKnownIn(const XQueryContextInternal& context, const XQueryNameTest& test) {
+  if (!test.mayRaise()) return true;
+  Ref<NSString> prefix;
+  Ref<NSString> localPart;
+  XQueryQName::parseQNameString(test.name(), prefix, localPart);
+  return prefix && context.contextNamespaceForPrefix(prefix->view());
 }
 
 // In the place of a fold, when all else is evaluated: the value that it has come to, or its
@@ -140,6 +154,19 @@ std::unique_ptr<const XQueryStreamProgram> XQueryStreamProgram::of(const XQueryP
   }
   if (XQueryPlanIsEnabled()) planParts(prolog, *result);
   return result;
+}
+
+// Prefixes that the query does not declare are looked up in the main module alone, where all of the
+// ways to the records are.
+Ref<XQueryError> XQueryStreamProgram::refusalIn(const XQueryContext& context,
+                                                const XQueryProlog& prolog) const {
+  for (const std::vector<Step>& record : records) {
+    for (const Step& step : record) {
+      if (!step.name || isKnownIn(_internal(context), *step.name)) continue;
+      return refusalAt(*step.name, "a prefix on the way to the records is not declared", prolog);
+    }
+  }
+  return {};
 }
 
 }  // namespace xquery

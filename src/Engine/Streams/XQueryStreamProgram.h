@@ -14,6 +14,7 @@
 
 namespace xquery {
 
+class XQueryContext;
 class XQueryProlog;
 
 struct XQueryStreamProgram {
@@ -40,6 +41,12 @@ struct XQueryStreamProgram {
   Ref<XQueryExpr> around;
   int64_t firstVariable = 0;
   std::string description;  // XQueryStreamPlan::description
+
+  // Where the context does not know the prefix of a name on the way to the records, the refusal:
+  // the whole document is without fault there as long as no earlier step finds anything, of which
+  // the records tell nothing. Null where it knows them all.
+  [[nodiscard]] Ref<XQueryError> refusalIn(const XQueryContext& context,
+                                           const XQueryProlog& prolog) const;
 
   // Of a query that has been bound. Null, with the refusal, for one that cannot be evaluated so.
   [[nodiscard]] static std::unique_ptr<const XQueryStreamProgram> of(const XQueryProlog& prolog,
