@@ -42,7 +42,7 @@ void XQueryRecordAnalysis::endPart(XQueryPlaceID place) {
   _now.place = place;
   _plan.parts.push_back(std::exchange(_now, {}));
   _part = _recordClause = XQueryNoPlace;
-  _isAnywhere = _isComplete = _bindsRecords = false;
+  _isAnywhere = _isByParents = _isComplete = _bindsRecords = false;
 }
 
 bool XQueryRecordAnalysis::isPathOfDocument(XQueryPlaceID place) const {
@@ -219,6 +219,7 @@ bool XQueryRecordAnalysis::takeRecordStep(const XQueryStep& step, XQueryPlaceID 
   const bool hasPredicates = !step.predicates().empty();
   if (axisStep->axis() == XQueryAxisDescendantOrSelf && asksForAnyNode(test) && !hasPredicates) {
     beginAnywhere(path);
+    _isByParents = true;
     _part = _program.nextPart(_part);
     return true;
   }
@@ -230,6 +231,8 @@ bool XQueryRecordAnalysis::takeRecordStep(const XQueryStep& step, XQueryPlaceID 
     if (isDescendant || _isAnywhere) refuse(path, "positions are counted below any element");
     return false;
   }
+  // Of what the descendant axis finds elements may lie in one another.
+  if (levelOfRecord() == SIZE_MAX) _isByParents = true;
   if (isDescendant) beginAnywhere(path);
   _now.record.push_back({std::exchange(_isAnywhere, false), name});
   _part = _program.nextPart(_part);
@@ -304,6 +307,10 @@ void XQueryRecordAnalysis::takeInnerStep(const XQueryStep& step, XQueryPlaceID p
         _facts[_part].are(XQueryItems::Node) && _facts[_part].tree == XQueryTreeFact::OfContext;
     if (!findsNodes && (step.next() || !makesValues(_part))) {
       refuse(path, "a step answers what may be no node of the record");
+    }
+    // Nodes are sorted at the end of the path.
+    if (!findsNodes && _isByParents) {
+      refuse(path, "values of what is found below any element are not in document order");
     }
     checkStaysInside(_part);
   }

@@ -53,6 +53,7 @@ class XQueryRecordAnalysis : protected XQueryDocumentAnalysis<XQueryStreamPlan> 
 
   XQueryPlaceID _part = XQueryNoPlace;  // of the path, the next of those of the step at hand
   bool _isAnywhere = false;             // "//" has been met and waits for the name behind it
+  bool _isByParents = false;  // so what the steps find is not in document order before it is sorted
   bool _isComplete = false;
   bool _bindsRecords = false;                   // the path finds the records themselves
   XQueryPlaceID _recordClause = XQueryNoPlace;  // whose variable is a record that holds descendants
