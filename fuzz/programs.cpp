@@ -106,6 +106,8 @@ class Comparison {
       found = plantest::outcomeOf(*failure.error);  // items before it were handed out
     }
     if (isComplete && failed(whole) && mayEndEarly(*query)) return;
+    // Of several errors another one may be met first: a fold fails before later records do.
+    if (failure.error && failed(whole) && hasFold(*query)) return;
     compare(whole, found, "streamed");
   }
 
@@ -122,6 +124,11 @@ class Comparison {
       if (result.starts_with(each)) return true;
     }
     return false;
+  }
+
+  static bool hasFold(const XQuery& query) {
+    return XQueryStreamDescription(query).find("\nresult: items as they are found") ==
+           std::string::npos;
   }
 
   bool stream(const XQuery& query, Outcome& found, XQueryStreamFailure& failure) const {

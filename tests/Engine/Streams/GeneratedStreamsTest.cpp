@@ -109,7 +109,10 @@ class Generator {
                  "descendant::*/@i",
                  "p:b",
                  "c/p:b",
-                 "*[p:b]"});
+                 "*[p:b]",
+                 "string(c[1])",
+                 "*/name()",
+                 "c/data(.)"});
   }
   std::string condition(const std::string& of) {
     switch (below(4)) {
@@ -140,7 +143,8 @@ class Generator {
   std::string path() {
     std::string text = pick({"/a", "/a", "a", "", "/*"});
     for (int left = 1 + below(3); left > 0; --left) {
-      text += pick({"/", "/", "/", "//"}) + pick({"a", "b", "b", "b", "c", "c", "*", "*", "p:b"}) +
+      text += pick({"/", "/", "/", "/", "//", "/descendant::"}) +
+              pick({"a", "b", "b", "b", "c", "c", "*", "*", "p:b"}) +
               (below(3) == 0 ? predicate() : "");
     }
     return text + (below(3) == 0 ? "/" + relative() : "");
@@ -253,9 +257,9 @@ TEST(GeneratedStreams, AnswerWhatTheWholeDocumentWould) {
         continue;
       }
       if (mayEndEarly(text) && whole.starts_with("error") && answer != whole) continue;
-      // Of several errors another one may be met first.
-      const bool hasSeveral = XQueryStreamDescription(*query).find(" of ") != std::string::npos;
-      if (hasSeveral && whole.starts_with("error") && answer.starts_with("error")) continue;
+      // Of several errors another one may be met first: a fold fails before later records do.
+      const bool hasFold = XQueryStreamDescription(*query).find("items as") == std::string::npos;
+      if (hasFold && whole.starts_with("error") && answer.starts_with("error")) continue;
       ASSERT_EQ(answer, whole) << "seed " << seed << "\n" << text << "\n" << xml;
     }
   }
