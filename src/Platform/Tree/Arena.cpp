@@ -286,14 +286,14 @@ void NSXMLTree::setAdoptedName(NSXMLNode* node, const NSXMLName* name) {
 
 void NSXMLTree::setURI(NSXMLDocument* document, const NSString* URI) {
   // A copy: a string that references text of this very tree would keep it alive for ever.
-  NSString* text = URI ? NSString::stringWithView(URI->view()).detach() : nullptr;
+  Ref<NSString> text;
+  if (URI) text = NSString::stringWithView(URI->view());
+  // Where there is no memory nothing has changed.
   auto& documents = makeExtra().documents;
-  if (document->_URI) {
-    NSCounting::release(*document->_URI);
-    std::erase(documents, document);
-  }
-  document->_URI = text;
-  if (text) documents.push_back(document);
+  if (text && !document->_URI) documents.push_back(document);
+  if (document->_URI) NSCounting::release(*document->_URI);
+  if (document->_URI && !text) std::erase(documents, document);
+  document->_URI = text ? text.detach() : nullptr;
 }
 
 namespace {
