@@ -85,6 +85,7 @@ class CaseTest : public testing::Test {
     std::vector<std::string> lines;
     if (way == XQueryWay::Streamed) {
       if (!canBeStreamed(*query) || !stream(*query, *context, lines, error)) return;
+      if (error && isRefusal(*error)) return;
     } else {
       const auto items = context->evaluateXQuery(*query, _case.constants, document, &error);
       for (size_t i = 0; items && i < items->count(); ++i) {
@@ -116,6 +117,12 @@ class CaseTest : public testing::Test {
     const auto errors = query.parseErrors();
     return !_case.xml.empty() &&
            !(errors && cast<XQueryError>(errors->objects().front())->err() == 0);
+  }
+
+  // Some programs are refused when the stream begins: only the context knows its namespaces.
+  static bool isRefusal(const XQueryError& error) {
+    return error.err() == 0 &&
+           error.description()->utf8().find("cannot be evaluated as a stream") != std::string::npos;
   }
 
   // False where the document is none that is read so.
