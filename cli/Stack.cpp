@@ -1,8 +1,13 @@
 #include "Stack.h"
 
 #include <algorithm>
+#include <cinttypes>
 #include <cstddef>
+#include <cstdint>
+#include <cstdio>
 #include <filesystem>
+#include <fstream>
+#include <string>
 #include <sys/auxv.h>
 #include <sys/resource.h>
 #include <system_error>
@@ -18,6 +23,9 @@ constexpr size_t stackSize = size_t{256} << 20;
 constexpr size_t stackSize = size_t{1} << 30;
 #endif
 
+// What stays free between a stack that is full and what lies below it.
+constexpr size_t keptFromStack = size_t{2} << 20;
+
 // How much address space the process may take; RLIM_INFINITY where it is not bounded.
 rlim_t addressSpace() {
   rlimit space;
@@ -28,6 +36,32 @@ bool hasLargeStack() {
   rlimit limit;
   return getrlimit(RLIMIT_STACK, &limit) == 0 && limit.rlim_cur != RLIM_INFINITY &&
          limit.rlim_cur >= stackSize;
+}
+
+// Whether the main thread, which this is, finds so much free below its stack.
+bool hasRoomForLargeStack() {
+  std::ifstream maps("/proc/self/maps");
+  const auto here = reinterpret_cast<uintptr_t>(&maps);
+  uintptr_t below = 0;  // the end of what lies below
+  std::string line;
+  while (std::getline(maps, line)) {
+    uintptr_t begin = 0;
+    uintptr_t end = 0;
+    if (std::sscanf(line.c_str(), "%" SCNxPTR "-%" SCNxPTR, &begin, &end) != 2) return false;
+    if (here < end) return here >= begin && end - below >= stackSize + keptFromStack;
+    below = end;
+  }
+  return false;
+}
+
+// It is never tried twice, since a program that was started so finds the limit raised; emulators
+// that only pretend to raise it are not believed.
+void restart(char** argv) {
+  // What was started as an argument of the dynamic loader finds the loader in /proc.
+  const bool isStartedByLoader = getauxval(AT_BASE) == 0;
+  std::error_code error;
+  const std::filesystem::path program = std::filesystem::read_symlink("/proc/self/exe", error);
+  if (!error && !isStartedByLoader) execv(program.c_str(), argv);
 }
 
 bool usesMainStack() {
@@ -41,23 +75,15 @@ void* runWork(void* work) {
 
 }  // namespace
 
-// It is never tried twice, since a program that was started so finds the limit raised; emulators
-// that only pretend to raise it are not believed.
-void restartWithLargeStack(char** argv) {
-  if (addressSpace() != RLIM_INFINITY || hasLargeStack()) return;
-  // What was started as an argument of the dynamic loader finds the loader in /proc.
-  const bool isStartedByLoader = getauxval(AT_BASE) == 0;
+void takeLargeStack(char** argv) {
   rlimit limit;
-  if (isStartedByLoader || getrlimit(RLIMIT_STACK, &limit) != 0 || limit.rlim_max < stackSize) {
-    return;
-  }
-  std::error_code error;
-  const std::filesystem::path program = std::filesystem::read_symlink("/proc/self/exe", error);
-  if (error) return;
+  if (addressSpace() != RLIM_INFINITY || hasLargeStack()) return;
+  if (getrlimit(RLIMIT_STACK, &limit) != 0 || limit.rlim_max < stackSize) return;
   const rlim_t previous = limit.rlim_cur;
   limit.rlim_cur = stackSize;
   if (setrlimit(RLIMIT_STACK, &limit) != 0 || !hasLargeStack()) return;
-  execv(program.c_str(), argv);
+  if (hasRoomForLargeStack()) return;
+  restart(argv);
   limit.rlim_cur = previous;
   setrlimit(RLIMIT_STACK, &limit);
 }

@@ -2,12 +2,15 @@
 // one: a hundred thousand calls within clauses and constructors find room. Only what is used of it
 // is ever touched.
 //
-// The stack of the main thread grows up to a limit that takes effect when a program starts, so the
-// limit is raised and the program started anew. A thread with a large stack would do without that,
-// but a process with two threads counts references and allocates with atomic steps: arithmetic over
-// a range took 1.7 times as long. It remains for where the limit cannot be raised, and for where
-// the address space is bounded: the room for a thread's stack is taken beforehand, whereas a main
-// thread that finds none when its stack grows is killed.
+// The stack of the main thread grows up to a limit, which is raised, as far as there is room below
+// it: what the kernel left free there when the program started. That was at random, at least half
+// of what is wanted and nearly always all; where it is not, the program is started anew, so that
+// the limit makes the room. Starting takes as long again, which is why it is looked at first. A
+// thread with a large stack would do without either, but a process with two threads counts
+// references and allocates with atomic steps: arithmetic over a range took 1.7 times as long. It
+// remains for where the limit cannot be raised, and for where the address space is bounded: the
+// room for a thread's stack is taken beforehand, whereas a main thread that finds none when its
+// stack grows is killed.
 #pragma once
 
 #include <functional>
@@ -18,7 +21,7 @@ namespace cli {
 
 // Comes back on a main thread with a large stack, started anew if need be, or where it cannot have
 // one. To be called before anything else.
-void restartWithLargeStack(char** argv);
+void takeLargeStack(char** argv);
 
 // Runs the work, on this thread where its stack is large and on another one otherwise. False when
 // no thread can be started.

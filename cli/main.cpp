@@ -6,7 +6,7 @@
 #include "Streams.h"
 
 int main(int argc, char** argv) {
-  cli::restartWithLargeStack(argv);
+  cli::takeLargeStack(argv);
   cli::prepareStandardStreams();
   cli::Options options;
   if (const auto status = cli::parseOptions(argc, argv, options)) return *status;
