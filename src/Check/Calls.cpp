@@ -219,9 +219,9 @@ void lookAtNormalForm(XQueryChecking& checking, XQueryPlaceID call, std::string_
   checking.warn(call, ID::NormalForm, {checking.labelOf(checking.argument(call, 1))});
 }
 
-// The groups of a pattern that take what they match.
-size_t groupsIn(std::string_view pattern) {
-  size_t count = 0;
+// Visits the places of a pattern's characters that are neither in classes nor behind backslashes.
+template <class Visit>
+void visitBareCharacters(std::string_view pattern, Visit visit) {
   bool isInClass = false;
   for (size_t i = 0; i < pattern.size(); ++i) {
     if (pattern[i] == '\\') {
@@ -230,10 +230,18 @@ size_t groupsIn(std::string_view pattern) {
       isInClass = true;
     } else if (pattern[i] == ']') {
       isInClass = false;
-    } else if (pattern[i] == '(' && !isInClass && !pattern.substr(i + 1).starts_with('?')) {
-      ++count;
+    } else if (!isInClass) {
+      visit(i);
     }
   }
+}
+
+// The groups of a pattern that take what they match.
+size_t groupsIn(std::string_view pattern) {
+  size_t count = 0;
+  visitBareCharacters(pattern, [&](size_t i) {
+    if (pattern[i] == '(' && !pattern.substr(i + 1).starts_with('?')) ++count;
+  });
   return count;
 }
 
@@ -297,19 +305,9 @@ std::string otherConstructIn(std::string_view pattern) {
 
 // Where white space is passed over, what stands behind "#" is, up to the end of its line.
 bool hasComment(std::string_view pattern) {
-  bool isInClass = false;
-  for (size_t i = 0; i < pattern.size(); ++i) {
-    if (pattern[i] == '\\') {
-      ++i;
-    } else if (pattern[i] == '[') {
-      isInClass = true;
-    } else if (pattern[i] == ']') {
-      isInClass = false;
-    } else if (pattern[i] == '#' && !isInClass) {
-      return true;
-    }
-  }
-  return false;
+  bool isThere = false;
+  visitBareCharacters(pattern, [&](size_t i) { isThere = isThere || pattern[i] == '#'; });
+  return isThere;
 }
 
 // Asks the engine itself. Compiling takes stack for each group, of which most patterns have few.
