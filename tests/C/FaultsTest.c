@@ -198,16 +198,6 @@ static xq_status making_values(void) {
   return status == XQ_END ? XQ_OK : status;
 }
 
-static ptrdiff_t read_text(void* data, char* buffer, size_t size) {
-  const char** rest = (const char**)data;
-  size_t count = strlen(*rest);
-  if (count > size) count = size;
-  if (count > 7) count = 7;
-  memcpy(buffer, *rest, count);
-  *rest += count;
-  return (ptrdiff_t)count;
-}
-
 static xq_status receive_text(void* data, const xq_value* item) {
   return told(xq_value_xml(item, 0, (xq_text*)data));
 }
@@ -228,7 +218,7 @@ static xq_status stream(void) {
   if (!status) status = xq_context_new(&context);
   if (!status) {
     status =
-        xq_stream_input(context, query, read_text, &rest, XQ_READ_XML, receive_text, &text, &error);
+        xq_stream_input(context, query, read_string, &rest, XQ_READ_XML, receive_text, &text, &error);
   }
   xq_error_free(error);
   xq_text_free(&text);

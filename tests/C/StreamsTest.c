@@ -28,16 +28,6 @@ static xq_status receive(void* data, const xq_value* item) {
   return by->count == by->ends_at ? XQ_END : XQ_OK;
 }
 
-static ptrdiff_t read_string(void* data, char* buffer, size_t size) {
-  const char** rest = (const char**)data;
-  size_t count = strlen(*rest);
-  if (count > size) count = size;
-  if (count > 7) count = 7;
-  memcpy(buffer, *rest, count);
-  *rest += count;
-  return (ptrdiff_t)count;
-}
-
 static xq_status stream_text(const char* query_text, const char* xml, receiver* by,
                              xq_error** error) {
   xq_query* query = compiled_in(XQ_WAY_STREAMED, query_text);

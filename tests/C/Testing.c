@@ -132,3 +132,13 @@ void* handle_of_another_kind(void) {
   if (!cancel) CHECK_OK(xq_cancel_new(&cancel));
   return cancel;
 }
+
+ptrdiff_t read_string(void* data, char* buffer, size_t size) {
+  const char** rest = (const char**)data;
+  size_t count = strlen(*rest);
+  if (count > size) count = size;
+  if (count > 7) count = 7;
+  memcpy(buffer, *rest, count);
+  *rest += count;
+  return (ptrdiff_t)count;
+}

@@ -71,6 +71,9 @@ void check_answer(const char* text, const xq_node* node, const char* expected);
 void check_items(const xq_value* items, const char* expected);
 /* Checks that the next evaluation of a fresh context works. */
 void check_still_works(void);
+/* Gives a stream a few bytes at a time of the text that the pointer at `data` points to, and moves
+ * it on. */
+ptrdiff_t read_string(void* data, char* buffer, size_t size);
 /* A handle of a kind that the function under test does not take. */
 void* handle_of_another_kind(void);
 
