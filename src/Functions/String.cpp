@@ -8,7 +8,10 @@
 #include "Types/XQueryCasting.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"
+#include "Types/XQueryUntypedText.h"
 
+#include <array>
+#include <cstring>
 #include <new>
 #include <optional>
 #include <string>
@@ -23,6 +26,37 @@ Value textToConcat(const Value& argument, XQueryContext& context) {
   if (isNull(item) || isa<NSString>(item)) return item;
   return XQueryCastAsTypeForContext(item, XQueryTypeString, context);
 }
+
+// A text that is put together where it lies, without memory of its own while it is short and 8-bit.
+class ShortText {
+ public:
+  void append(NSStringView piece) {
+    if (_isLong || piece.isWide() || piece.length() > _units.size() - _length) {
+      appendToLong(piece);
+      return;
+    }
+    // An empty piece may lie nowhere.
+    if (piece.length() == 0) return;
+    std::memcpy(_units.data() + _length, piece.asciiUnits(), piece.length());
+    _length += piece.length();
+  }
+  Ref<NSString> string() const {
+    return _isLong ? _long.string() : NSString::stringWithView(here());
+  }
+
+ private:
+  NSStringView here() const { return NSStringView::ascii({_units.data(), _length}); }
+  void appendToLong(NSStringView piece) {
+    if (!_isLong) _long.append(here());
+    _isLong = true;
+    _long.append(piece);
+  }
+
+  std::array<char, 256> _units;
+  size_t _length = 0;
+  bool _isLong = false;
+  NSMutableString _long;
+};
 
 // The length of the joined strings where all of them and the separator are 8-bit.
 std::optional<size_t> narrowJoinedLength(const NSArray& items, NSStringView separator) {
@@ -82,9 +116,15 @@ Value fn_compare(const Value* arguments, size_t count, XQueryContext& context) {
 // The answer is a plain string, which is an untyped value.
 Value fn_concat(const Value* arguments, size_t count, XQueryContext& context) {
   if (count < 2) return Value();
-  NSMutableString text;
+  ShortText text;
   for (size_t index = 0; index < count; ++index) {
-    const Value item = textToConcat(arguments[index], context);
+    const Value& argument = arguments[index];
+    // The text of a node, too, is that of its value.
+    if (XQueryIsNode(argument.get()) || isa<NSString>(argument)) {
+      text.append(XQueryUntypedText(*argument).view());
+      continue;
+    }
+    const Value item = textToConcat(argument, context);
     if (isNull(item)) continue;
     if (!isa<NSString>(item)) return item;
     text.append(cast<NSString>(item)->view());

@@ -75,6 +75,21 @@ TEST(Concat, KeepsTextOutsideASCII) {
             "untypedAtomic a\xC3\xA9\xF0\x9F\x98\x80");
 }
 
+// Whatever length the pieces have, and wherever the first wide one stands.
+TEST(Concat, PutsShortAndLongPiecesTogether) {
+  for (const size_t length : {0, 1, 127, 128, 255, 256, 257, 300, 5000}) {
+    const std::string piece(length, 'x');
+    const std::string wide = piece + "\xC3\xA9";
+    for (const std::string& first : {piece, wide}) {
+      for (const std::string& second : {piece, wide}) {
+        const auto tree = elementFrom("<a>" + second + "</a>");
+        EXPECT_EQ(call(fn_concat, {string(first), tree, integer(7), untyped(first)}),
+                  "untypedAtomic " + first + second + "7" + first);
+      }
+    }
+  }
+}
+
 TEST(Concat, AnArgumentOfSeveralItemsIsAnError) {
   EXPECT_EQ(call(fn_concat, {sequence({integer(1), integer(2)}), string("a")}),
             "error 6 invalid type for automization");
