@@ -86,6 +86,49 @@ TEST(LookUpValues, TakesProbesFromTheRootInPredicates) {
 }
 
 // A predicate that says no more than that there is the value is not asked again.
+// What meets either of several conditions is found by each, and put together.
+TEST(LookUpValues, TakesConditionsThatHoldForOneOfSeveralValues) {
+  for (const char* text :
+       {"/r/e[@id = 'e7' or k = 'k3']",
+        "(//e | //k)[@id = 'e7' or k = 'k3']",
+        "for $x in ((), 'k3') return count(//e[@id = $x or k = 'k1'])",
+        "//e[@id = 'e7' or @id = 'e6' or k/b = '1']/@n",
+        "//e[(@id, k) = 'k3']/@id",
+        "//e['e6' = (k, @id, s/@x)]",
+        "//*[@id = 'e7' or k = 'k3']/@id",
+        "//@n[. = '3' or . = '4']/..",
+        "//e[s and (@id = 'e7' or k = 'k3' and @n)]/@id",
+
+        "//e[@id eq 'e3' or k eq 'k3']/@id",
+        "//e[string(@id) = 'e3' or string(@none) = '']/@id",
+
+        "for $p in ('e3', 'k3', '') return //e[@id = $p or k = $p]/@n",
+        "for $p in /r/e[position() < 9] return count(//e[k = $p/k or @id = $p/@id])",
+        "for $p in ('e3', 'k3') return count(//e[(@id, k) = $p])",
+        "for $e in /r/e where $e/@id = 'e7' or $e/k = 'k3' return $e/@n",
+        "for $e in /r/e where ($e/@id, $e/k) = 'k3' and $e/s return $e/@n",
+        "for $e in /r/e let $n := string($e/@n) where $n = '3' or $e/@id = 'e9' return $e/k",
+
+        "//e[k[. = 'k3'] or exists(v[. = '7.0'])]/@id",
+        "declare function local:is($e, $x) { $e/@id = $x or $e/k = $x }; //e[local:is(., "
+        "'k3')]/@id",
+        "//e[some $k in (k) satisfies ($k = 'k1' or $k = 'k3')]/@id"}) {
+    EXPECT_GE(lookupsIn(text), 1U) << text;
+    resultOf(text);
+  }
+  // Nine matches are more than are looked for.
+  for (const char* text :
+       {"//e[@id = () or k = 'k3']/@id", "//e[@id = 'e3' or k = 7]/@id",
+        "(//e | //k)[@id = 'e7' or . = 'k3']", "//e[@id = 'e7' or s]",
+        "//e[@id = 'e7' or @n != '3']", "//e[not(@id = 'e7' or k = 'k3')]",
+        "//e[(@id, s/text()/..) = 'e7']", "//*[@id = 'e7' or . = 'k3']", "//e[(@id, 'e7') = 'e7']",
+        "//e[@n=1 or @n='2' or @n='3' or @n='4' or @n='5' or @n='6' or @n='7' or @n='8' or @n='9']",
+        "for $e in /r/e where $e/@id = 'e7' or $e/k eq 'k3' return $e/@n"}) {
+    EXPECT_EQ(lookupsIn(text), 0U) << text;
+    resultOf(text);
+  }
+}
+
 TEST(LookUpValues, AnswersPredicatesThatAskForNothingElse) {
   const auto stepsOf = [](std::string_view text) {
     const auto query = compiled(text, XQueryWay::Planned);
@@ -116,7 +159,7 @@ TEST(LookUpValues, AnswersPredicatesThatAskForNothingElse) {
       std::string text(test);
       text.replace(text.find('P'), 1, probe);
       resultOf("for $p in ('k1', 'k4', 'e3', '7') return (" + text + ")");
-      resultOf("for $p in //e[position() < 5]/(@id | k) return " + text);
+      resultOf("for $p in (//e)[k][1]/(@id | k) return " + text);
     }
   }
 }
@@ -459,7 +502,7 @@ TEST(LookUpValues, AgreeWithWalkingOverGeneratedQueries) {
                                            "//e[5]/k[1]",
                                            "//e[@n < 5]/k"};
   const std::vector<std::string> others = {"", "[s]", "[not(k)]", "[@n < 20]", "[count(k) > 1]"};
-  for (int i = 0; i < 80; ++i) {
+  for (int i = 0; i < 120; ++i) {
     const std::string key = random.oneOf(keys), probe = random.oneOf(probes);
     const std::string ends = random.oneOf({"", "/@id", "/k", "/..", "//k"});
     const std::string path = random.oneOf({"/r/e", "//e", "/r/e/e", "$p/e", "//e/e", "//k", "//*",
@@ -471,9 +514,12 @@ TEST(LookUpValues, AgreeWithWalkingOverGeneratedQueries) {
               (random.below(3) == 0 ? " and $e/s" : "") + " return $e" + ends;
     } else {
       const std::string equals = random.oneOf({" = ", " eq "}) + probe;
+      const std::string other = random.oneOf(keys) + " = " + random.oneOf(probes);
       const std::string condition =
-          random.oneOf({key + equals, "some $v in " + key + " satisfies $v" + equals,
-                        key + "[." + equals + "]", "not(empty(" + key + "[." + equals + "]))",
+          random.oneOf({key + equals, key + equals + " or " + other,
+                        "(" + key + ", " + random.oneOf(keys) + ")" + equals,
+                        "some $v in " + key + " satisfies $v" + equals, key + "[." + equals + "]",
+                        "not(empty(" + key + "[." + equals + "]))",
                         "exists(for $v in " + key + " where $v" + equals + " return $v)",
                         "data(" + key + ")" + equals, "string(" + key + ")" + equals});
       text += path + random.oneOf(others) + "[" + condition + "]" + random.oneOf(others) + ends;

@@ -10,6 +10,8 @@
 #include "Platform/Tree/TreeHead.h"
 
 #include <algorithm>
+#include <array>
+#include <utility>
 
 namespace xquery {
 namespace {
@@ -90,40 +92,40 @@ Value valueFrom(const XQueryExpr& probe, NSXMLNode* node, XQueryContext& context
   return value;
 }
 
-}  // namespace
-
-XQueryValueLookup::XQueryValueLookup(Of of, const NSXMLExpandedName* name,
-                                     const XQueryValueWay& way, Probe probe, First first)
-    : _of(of),
-      _name(name),
-      _way(way),
-      _key(keyOf(of, name, way)),
-      _probe(std::move(probe)),
-      _first(first) {}
-
-bool XQueryValueLookup::isReady(const NSXMLNode* root) const {
-  return _probe.areTexts && NSXMLIndexedValues::of(_key, root, nullptr).values != nullptr;
-}
-
 // Numbers and dates are compared with what a text means, "eq" refuses several values, and what has
 // no value is not in the index: walking must tell.
-bool XQueryValueLookup::areTexts(const XQueryItemList& probes) const {
-  if (probes.count() == 0 || (probes.count() > 1 && !_probe.takesSeveral)) return false;
+bool areTexts(const XQueryItemList& probes, const XQueryValueLookup::Probe& asked) {
+  if (probes.count() == 0 || (probes.count() > 1 && !asked.takesSeveral)) return false;
   WorkPacer pacer;
   for (size_t index = 0; index < probes.count(); ++index) {
     pacer.turn();
     const XQueryJoinOperand probe(probes[index]);
     if (!probe.isText()) return false;
-    if (_probe.meetsNoneWhenEmpty && probe.text.view().length() == 0) return false;
+    if (asked.meetsNoneWhenEmpty && probe.text.view().length() == 0) return false;
   }
   return true;
 }
 
+}  // namespace
+
+XQueryValueLookup::XQueryValueLookup(Of of, const NSXMLExpandedName* name,
+                                     std::vector<Match> matches, First first)
+    : _of(of), _name(name), _first(first) {
+  for (Match& match : matches) {
+    NSXMLValueKey key = keyOf(of, name, match.way);
+    _matches.push_back({std::move(match), std::move(key)});
+  }
+}
+
+bool XQueryValueLookup::isReady(const NSXMLNode* root) const {
+  return std::all_of(_matches.begin(), _matches.end(), [root](const KeyedMatch& each) {
+    return each.match.probe.areTexts && NSXMLIndexedValues::of(each.key, root, nullptr).values;
+  });
+}
+
 // The nodes of one value come in document order, unless the way leads up from them.
 void XQueryValueLookup::addNodesWith(const NSXMLValueIndex& values, const XQueryItemList& probes,
-                                     const NSXMLNode* first, const NSXMLNode* stop,
-                                     XQueryStepTest& test,
-                                     std::vector<NSXMLNode*>& candidates) const {
+                                     const XQueryValueWay& way, const Search& search) const {
   // What several have for their value is listed once, where they are many.
   std::vector<bool> areListed(probes.count() > fewProbes ? values.valueCount() : 0);
   WorkPacer pacer;
@@ -135,26 +137,25 @@ void XQueryValueLookup::addNodesWith(const NSXMLValueIndex& values, const XQuery
       if (areListed[number]) continue;
       areListed[number] = true;
     }
-    const auto found = NSXMLNameIndex::between(values.nodes(number), first, stop);
+    const auto found = NSXMLNameIndex::between(values.nodes(number), search.first, search.stop);
     if (_of == Of::Attribute) {
-      listAttributes(found, candidates);
+      listAttributes(found, search.candidates);
     } else if (_of == Of::AnyName) {
-      climb(found, first, test, candidates);
+      climb(found, way, search);
     } else {
-      candidates.insert(candidates.end(), found.begin(), found.end());
+      search.candidates.insert(search.candidates.end(), found.begin(), found.end());
     }
   }
-  if (_of == Of::AnyName || probes.count() > 1) putInOrder(candidates);
 }
 
 // Nodes in document order may have starts in another one, and several the same.
-void XQueryValueLookup::climb(NSXMLNodeSpan ends, const NSXMLNode* first, XQueryStepTest& test,
-                              std::vector<NSXMLNode*>& candidates) const {
+void XQueryValueLookup::climb(NSXMLNodeSpan ends, const XQueryValueWay& way, const Search& search) {
+  auto& candidates = search.candidates;
   WorkPacer pacer;
   for (NSXMLNode* end : ends) {
     pacer.turn();
-    NSXMLNode* node = _way.start(end);
-    if (!node || isBefore(node, first) || !test.matches(node)) continue;
+    NSXMLNode* node = way.start(end);
+    if (!node || isBefore(node, search.first) || !search.test.matches(node)) continue;
     if (candidates.empty() || candidates.back() != node) candidates.push_back(node);
   }
 }
@@ -173,20 +174,43 @@ bool XQueryValueLookup::find(NSXMLNode* node, int axis, XQueryStepTest& test,
   if ((axis == XQueryAxisAttributesBelow) != (_of == Of::Attribute)) return false;
   if (_name && test.onlyName() != _name.get()) return false;
   const Range range = rangeOf(node, axis);
-  if (!isWorthAsking(range) || !_way.isOpen(context)) return false;
+  if (!isWorthAsking(range)) return false;
   // No index is made for what it cannot answer.
-  const Value value = valueFrom(*_probe.expr, node, context);
-  const XQueryItemList probes(value.get());
-  if (value && probes.count() == 0 && _first == First::Holds) return true;
-  if (!value || !areTexts(probes)) return false;
-  const auto indexed = NSXMLIndexedValues::of(_key, range.first, range.stop);
-  if (!indexed.values) return false;
-  addNodesWith(*indexed.values, probes, range.first, range.stop, test, candidates);
+  std::array<Value, mostMatches> values;
+  size_t probeCount = 0;
+  for (size_t i = 0; i < _matches.size(); ++i) {
+    const auto& [way, probe] = _matches[i].match;
+    if (!way.isOpen(context)) return false;
+    values[i] = valueFrom(*probe.expr, node, context);
+    if (!values[i]) return false;
+    const XQueryItemList probes(values[i].get());
+    const bool meetsNone = probes.count() == 0 && (probe.takesSeveral || _first == First::Holds);
+    if (!meetsNone && !areTexts(probes, probe)) return false;
+    probeCount += probes.count();
+  }
+  const Search search{range.first, range.stop, test, candidates};
+  for (size_t i = 0; i < _matches.size(); ++i) {
+    const XQueryItemList probes(values[i].get());
+    if (probes.count() == 0) continue;
+    const auto indexed = NSXMLIndexedValues::of(_matches[i].key, range.first, range.stop);
+    if (!indexed.values) {
+      candidates.clear();
+      return false;
+    }
+    addNodesWith(*indexed.values, probes, _matches[i].match.way, search);
+  }
+  if (_of == Of::AnyName || probeCount > 1) putInOrder(candidates);
   return axis != XQueryAxisChild || keepChildren(node, candidates);
 }
 
 void XQueryValueLookup::noteAsked(const NSXMLNode* node, size_t nodes) const {
-  if (nodes >= fewElements) NSXMLNoteAskedValues(_key, nodes, node);
+  if (nodes < fewElements) return;
+  for (const KeyedMatch& each : _matches) {
+    // Several matches may ask for the same values.
+    const auto first = std::find_if(_matches.begin(), _matches.end(),
+                                    [&](const KeyedMatch& other) { return other.key == each.key; });
+    if (&*first == &each) NSXMLNoteAskedValues(each.key, nodes, node);
+  }
 }
 
 }  // namespace xquery

@@ -10,6 +10,9 @@
 //
 //   *[author/last = "x"]     last = "x"  ->  author  ->  *
 //   //@id[. = "x"]           elements with such an @id  ->  their @id
+//
+// A condition may hold for one of several values, as "person[@id = $x or name = $y]": then the
+// nodes that each finds are put together.
 #pragma once
 
 #include "Plan/Paths/XQueryValueWay.h"
@@ -40,12 +43,19 @@ class XQueryValueLookup {
     // Whatever it comes to are texts, if it does not fail.
     bool areTexts = false;
   };
+  // What the way leads to equals the probe.
+  struct Match {
+    XQueryValueWay way;
+    Probe probe;
+  };
+  // A condition of more of them is left to walking.
+  static constexpr size_t mostMatches = 8;
   // The first predicate that is not part of the test holds for all candidates; or not surely.
   enum class First : uint8_t { Asked, Holds };
 
-  // `name` is that of the elements or attributes, null for any.
-  XQueryValueLookup(Of of, const NSXMLExpandedName* name, const XQueryValueWay& way, Probe probe,
-                    First first);
+  // `name` is that of the elements or attributes, null for any. What has none of the matches does
+  // not meet the condition.
+  XQueryValueLookup(Of of, const NSXMLExpandedName* name, std::vector<Match> matches, First first);
 
   // How many predicates need not be asked of candidates.
   size_t answers() const { return _first == First::Holds ? 1 : 0; }
@@ -62,19 +72,26 @@ class XQueryValueLookup {
   void noteAsked(const NSXMLNode* node, size_t nodes) const;
 
  private:
-  bool areTexts(const XQueryItemList& probes) const;
+  // Where the values of a match lie, and those that are looked for there.
+  struct KeyedMatch {
+    Match match;
+    NSXMLValueKey key;
+  };
+  struct Search {
+    const NSXMLNode* first;
+    const NSXMLNode* stop;  // null for the end of the tree
+    XQueryStepTest& test;
+    std::vector<NSXMLNode*>& candidates;
+  };
+
   void addNodesWith(const NSXMLValueIndex& values, const XQueryItemList& probes,
-                    const NSXMLNode* first, const NSXMLNode* stop, XQueryStepTest& test,
-                    std::vector<NSXMLNode*>& candidates) const;
-  void climb(NSXMLNodeSpan ends, const NSXMLNode* first, XQueryStepTest& test,
-             std::vector<NSXMLNode*>& candidates) const;
+                    const XQueryValueWay& way, const Search& search) const;
+  static void climb(NSXMLNodeSpan ends, const XQueryValueWay& way, const Search& search);
   void listAttributes(NSXMLNodeSpan owners, std::vector<NSXMLNode*>& candidates) const;
 
   const Of _of;
   const NSXMLExpandedNameRef _name;
-  const XQueryValueWay _way;
-  const NSXMLValueKey _key;
-  const Probe _probe;
+  std::vector<KeyedMatch> _matches;
   const First _first;
 };
 

@@ -1,7 +1,7 @@
 // Values are looked up in the index of the tree.
 //
 // Pattern     a step child::name, child::*, descendant::name or //@name, also behind "//", with a
-//             predicate that holds only for what has a certain value (ValueConditions.h); such a
+//             predicate that holds only for what has one of some values (ValueConditions.h); such a
 //             step as the last one of P in "(P)[C]", where C is such a condition, and in "for $x in
 //             P ... where C"
 // Facts       of the step: all predicates ask for truth, whatever place a node has, and can be
@@ -27,6 +27,7 @@
 #include "Plan/Rules/StepsAround.h"
 #include "Plan/Rules/ValueConditions.h"
 
+#include <algorithm>
 #include <memory>
 #include <optional>
 #include <utility>
@@ -197,26 +198,26 @@ class Search {
     if (!target.isKnown) return std::nullopt;
     auto found = XQueryValueConditionIn(_planning, condition, origin);
     if (!found) return std::nullopt;
-    const XQueryValueWay& way = found->way;
-    const bool fits =
-        target.of == Of::Name || (target.of == Of::Attribute ? way.isEmpty() : way.hasKeyOfEnd());
-    return fits ? std::move(found) : std::nullopt;
+    const bool fit = std::all_of(
+        found->anyOf.begin(), found->anyOf.end(), [&](const XQueryValueLookup::Match& match) {
+          if (target.of == Of::Name) return true;
+          return target.of == Of::Attribute ? match.way.isEmpty() : match.way.hasKeyOfEnd();
+        });
+    return fit ? std::move(found) : std::nullopt;
   }
 
   // Tells the step to look up what can meet the condition.
   bool takeCondition(XQueryPlaceID condition, const XQueryValueOrigin& origin,
                      const XQueryWalkedPath& path, XQueryWalkedStep& step) const {
     const Target target = targetOf(path, step);
-    const auto found = conditionFor(condition, origin, target);
+    auto found = conditionFor(condition, origin, target);
     if (!found) return false;
     const auto& predicates = step.step->predicates();
     const bool isFirst = step.hasPredicates() && origin.varID == 0 &&
                          _program[condition].slot == &predicates[step.predicatesInTest];
     using First = XQueryValueLookup::First;
     step.lookup = std::make_unique<const XQueryValueLookup>(
-        target.of, target.name, found->way,
-        XQueryValueLookup::Probe{found->probe, found->meetsNoneWhenEmpty, found->takesSeveral,
-                                 found->areTexts},
+        target.of, target.name, std::move(found->anyOf),
         isFirst && found->isAll ? First::Holds : First::Asked);
     return true;
   }

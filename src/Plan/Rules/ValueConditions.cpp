@@ -5,6 +5,7 @@
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLeaves.h"
+#include "Expr/XQueryLists.h"
 #include "Functions/Boolean.h"
 #include "Functions/Node.h"
 #include "Functions/Sequence.h"
@@ -14,6 +15,8 @@
 #include "Plan/Rules/PositionConditions.h"
 #include "Prolog/XQueryDeclarations.h"
 
+#include <algorithm>
+#include <iterator>
 #include <utility>
 #include <vector>
 
@@ -21,6 +24,7 @@ namespace xquery {
 namespace {
 
 using Found = std::optional<XQueryValueCondition>;
+using Matches = std::vector<XQueryValueLookup::Match>;
 
 // Conditions nest in each other; further down nothing is looked for.
 constexpr int mostLevels = 16;
@@ -52,6 +56,7 @@ class Search {
     const XQueryExpr& expr = *_program[place].expr;
     if (const auto* operation = dyn_cast<XQueryOperatorExpr>(&expr)) {
       if (operation->operatorType() == XQueryOperatorAnd) return ofAnd(place, from, level);
+      if (operation->operatorType() == XQueryOperatorOr) return ofOr(place, from, level);
       return ofComparison(place, *operation, from, level);
     }
     if (isa<XQueryQuantifiedExpr>(&expr)) return ofSome(place, from, level);
@@ -87,6 +92,20 @@ class Search {
     return conditionIn(right, from, level + 1);
   }
 
+  Found ofOr(XQueryPlaceID place, const Start& from, int level) const {
+    const XQueryPlaceID left = _program.firstPart(place);
+    const XQueryPlaceID right = left == XQueryNoPlace ? left : _program.nextPart(left);
+    if (right == XQueryNoPlace) return std::nullopt;
+    Found found = conditionIn(left, from, level + 1);
+    Found other = found ? conditionIn(right, from, level + 1) : std::nullopt;
+    if (!other || found->anyOf.size() + other->anyOf.size() > XQueryValueLookup::mostMatches) {
+      return std::nullopt;
+    }
+    std::move(other->anyOf.begin(), other->anyOf.end(), std::back_inserter(found->anyOf));
+    found->isAll = false;
+    return found;
+  }
+
   Found ofNot(XQueryPlaceID place, const Start& from, int level) const {
     const XQueryExpr& expr = *_program[place].expr;
     if (isCallOf(expr, fn_not)) return conditionIn(argumentOf(place), from, level + 1);
@@ -116,7 +135,7 @@ class Search {
     Found found = ofOperands(left, right, isOfOne, from);
     if (!found) found = ofOperands(right, left, isOfOne, from);
     if (!found) return found;
-    found->takesSeveral = !isOfOne;
+    for (XQueryValueLookup::Match& match : found->anyOf) match.probe.takesSeveral = !isOfOne;
     found->isAll = found->isAll && level == 0;
     return found;
   }
@@ -153,17 +172,21 @@ class Search {
 
   // `isOfOne`: a key of several values is an error, which may be one to be seen.
   Found ofOperands(XQueryPlaceID key, XQueryPlaceID probe, bool isOfOne, const Start& from) const {
-    XQueryValueCondition found{from.way, {}};
+    XQueryValueCondition found;
     key = inside(key);
-    if (!isProbe(probe, from) || !readKey(key, from, found)) return std::nullopt;
+    if (!isProbe(probe, from) || !readKeys(key, from, found.anyOf)) return std::nullopt;
     const XQueryPlaceID value = boundByLet(key, from);
     const bool isOne = facts(value).most <= 1 || isTextOfOne(value);
     if (isOfOne && !isOne && !from.origin.errorExcludes) return std::nullopt;
     found.isAll = isBare(key, from) && (isOne || !isOfOne);
-    found.areTexts =
-        facts(probe).are(XQueryItems::Node | XQueryItems::Untyped | XQueryItems::String);
-    found.probe = from.caller ? probeOfCall(probe, from) : _planning.exprAt(probe);
-    return found.probe ? Found(std::move(found)) : std::nullopt;
+    const Ref<XQueryExpr> expr = from.caller ? probeOfCall(probe, from) : _planning.exprAt(probe);
+    if (!expr) return std::nullopt;
+    for (XQueryValueLookup::Match& match : found.anyOf) {
+      match.probe.areTexts =
+          facts(probe).are(XQueryItems::Node | XQueryItems::Untyped | XQueryItems::String);
+      match.probe.expr = expr;
+    }
+    return found;
   }
 
   bool isProbe(XQueryPlaceID place, const Start& from) const {
@@ -187,16 +210,31 @@ class Search {
     return facts(place).isRepeatable() && !facts(place).does(XQueryDeeds::LoadsDocuments);
   }
 
-  bool readKey(XQueryPlaceID key, const Start& from, XQueryValueCondition& found) const {
+  // A key, or a list of them.
+  bool readKeys(XQueryPlaceID key, const Start& from, Matches& found) const {
+    const auto* list = dyn_cast<XQueryExprList>(_program[key].expr);
+    if (!list || list->kind() != Kind::ExprList) return readKey(key, from, found);
+    if (list->count() == 0 || list->count() > XQueryValueLookup::mostMatches) return false;
+    for (XQueryPlaceID part = _program.firstPart(key); part != XQueryNoPlace;
+         part = _program.nextPart(part)) {
+      if (!readKey(inside(part), from, found)) return false;
+    }
+    return true;
+  }
+
+  bool readKey(XQueryPlaceID key, const Start& from, Matches& found) const {
+    XQueryValueLookup::Match match{from.way, {}};
     key = boundByLet(key, from);
     const XQueryExpr& expr = *_program[key].expr;
     const bool isString = isCallOf(expr, fn_string);
     if (isString || isCallOf(expr, fn_data)) {
-      found.meetsNoneWhenEmpty = isString;
+      match.probe.meetsNoneWhenEmpty = isString;
       if ((isString || !from.origin.errorExcludes) && !isTextOfOne(key)) return false;
       key = argumentOf(key);
     }
-    return readPath(*_program[key].expr, from, found.way);
+    if (!readPath(*_program[key].expr, from, match.way)) return false;
+    found.push_back(std::move(match));
+    return true;
   }
 
   // Of a variable that follows from the origin what it was set to.

@@ -1,23 +1,20 @@
 // Conditions that hold only for what has a certain value.
 #pragma once
 
-#include "Plan/Paths/XQueryValueWay.h"
+#include "Plan/Paths/XQueryValueLookup.h"
 #include "Plan/Planning.h"
 
 #include <optional>
+#include <vector>
 
 namespace xquery {
 
-// The condition holds only where the way leads to a value that equals the probe.
+// The condition holds only where one of the matches does: where its way leads to a value that
+// equals its probe. This is repeatable, and does not read the focus, but for the root above the
+// context item where that is the one above the node, too.
 struct XQueryValueCondition {
-  XQueryValueWay way;
-  // Repeatable; does not read the focus, but for the root above the context item where that is the
-  // one above the node, too.
-  Ref<XQueryExpr> probe;
-  bool meetsNoneWhenEmpty = false;  // or where it leads to none and the probe is the empty text
-  bool takesSeveral = false;        // the probe may be several values, of which one is equal
-  bool areTexts = false;            // the probe comes to nothing but texts
-  bool isAll = false;               // the condition says no more than that, and cannot fail there
+  std::vector<XQueryValueLookup::Match> anyOf;
+  bool isAll = false;  // the condition says no more than that, and cannot fail there
 };
 
 // Whose values a condition asks for.
@@ -32,10 +29,11 @@ struct XQueryValueOrigin {
 };
 
 // Finds such a condition among what has to hold for this one: in "K = P" and "K eq P", on either
-// side and joined with others by "and"; "some $k in K satisfies $k = P"; "K[. = P]" where its truth
-// is asked for, or whether it is there, also by exists, boolean, not(empty(...)) and count(...) >
-// 0, and as "for $k in K where $k = P return ..."; and in the body of a declared function. K may be
-// passed through string() or data(), or through a variable that a let clause sets.
+// side and joined with others by "and"; in both sides of "or"; "some $k in K satisfies $k = P";
+// "K[. = P]" where its truth is asked for, or whether it is there, also by exists, boolean,
+// not(empty(...)) and count(...) > 0, and as "for $k in K where $k = P return ..."; and in the body
+// of a declared function. K may be passed through string() or data(), or through a variable that a
+// let clause sets, and "(K, L) = P" asks for either.
 std::optional<XQueryValueCondition> XQueryValueConditionIn(const XQueryPlanning& planning,
                                                            XQueryPlaceID condition,
                                                            const XQueryValueOrigin& origin);
