@@ -72,6 +72,8 @@ constexpr std::array rules = {
     // Behind the joins, which evaluate what conditions consist of.
     XQueryRule{"early conditions", "a condition is asked as soon as what it reads is there",
                XQueryAskEarly},
+    XQueryRule{"scalars", "arithmetic, comparisons and logic over numbers make no objects between",
+               XQueryComputeScalars},
 };
 
 }  // namespace

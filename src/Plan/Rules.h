@@ -53,5 +53,6 @@ void XQueryBuildInPlace(XQueryPlanning& planning);
 void XQueryJoinConditions(XQueryPlanning& planning);
 void XQueryLookUpValues(XQueryPlanning& planning);
 void XQueryAskEarly(XQueryPlanning& planning);
+void XQueryComputeScalars(XQueryPlanning& planning);
 
 }  // namespace xquery

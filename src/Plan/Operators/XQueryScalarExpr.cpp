@@ -1,0 +1,227 @@
+#include "Plan/Operators/XQueryScalarExpr.h"
+
+#include "Context/XQueryContextInternal.h"
+#include "Expr/Operators/XQueryArithmetic.h"
+#include "Expr/Operators/XQueryComparison.h"
+#include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Types/XQueryNumber.h"
+#include "Types/XQueryNumericOperand.h"
+
+#include <cmath>
+
+namespace xquery {
+namespace {
+
+using Scalar = XQueryScalar;
+using Form = XQueryScalar::Form;
+
+// An operand of arithmetic: the number that an object holds, or is cast to when it is untyped.
+Scalar numberIn(const Scalar& operand, bool untypedOnes) {
+  if (operand.form == Form::Truth) return {};
+  if (operand.form != Form::Object) return operand;
+  const auto number = XQueryNumericOperand::of(operand.object, untypedOnes);
+  if (number.form == XQueryNumericOperand::Double) return Scalar::ofDouble(number.number);
+  const bool isSmall = number.form == XQueryNumericOperand::Exact && number.isInteger &&
+                       number.exact->isSmallInteger();
+  return isSmall ? Scalar::ofInteger(number.exact->smallInteger()) : Scalar();
+}
+
+// Integers beyond these are doubles only after rounding.
+bool isDoubleToo(const Scalar& number) {
+  return number.form == Form::Double ||
+         (number.integer <= XQueryExactIntegerBound && number.integer >= -XQueryExactIntegerBound);
+}
+
+double asDouble(const Scalar& number) {
+  return number.form == Form::Double ? number.number : static_cast<double>(number.integer);
+}
+
+Scalar ofIntegers(int type, int64_t a, int64_t b) {
+  int64_t result = 0;
+  bool isBeyond = false;
+  switch (type) {
+    case XQueryOperatorPlus:
+      isBeyond = __builtin_add_overflow(a, b, &result);
+      break;
+    case XQueryOperatorMinus:
+      isBeyond = __builtin_sub_overflow(a, b, &result);
+      break;
+    case XQueryOperatorMultiply:
+      isBeyond = __builtin_mul_overflow(a, b, &result);
+      break;
+    case XQueryOperatorIDiv:
+    case XQueryOperatorMod:
+      // Dividing by -1 is left out: the smallest integer has no counterpart.
+      isBeyond = b == 0 || b == -1;
+      if (!isBeyond) result = type == XQueryOperatorIDiv ? a / b : a % b;
+      break;
+    default:  // a quotient is a decimal
+      isBeyond = true;
+      break;
+  }
+  return isBeyond ? Scalar() : Scalar::ofInteger(result);
+}
+
+Scalar ofDoubles(int type, double a, double b) {
+  switch (type) {
+    case XQueryOperatorPlus:
+      return Scalar::ofDouble(a + b);
+    case XQueryOperatorMinus:
+      return Scalar::ofDouble(a - b);
+    case XQueryOperatorMultiply:
+      return Scalar::ofDouble(a * b);
+    case XQueryOperatorDiv:
+      return Scalar::ofDouble(XQueryQuotient(a, b));
+    case XQueryOperatorMod:
+      return Scalar::ofDouble(std::fmod(a, b));
+    default:  // an integer quotient may be beyond a word
+      return {};
+  }
+}
+
+Scalar arithmetic(int type, const Scalar& left, const Scalar& right) {
+  // For idiv an untyped operand is an integer, which is not what a scanned double tells.
+  const bool untypedOnes = type != XQueryOperatorIDiv;
+  const Scalar a = numberIn(left, untypedOnes);
+  const Scalar b = numberIn(right, untypedOnes);
+  if (a.form == Form::Unknown || b.form == Form::Unknown) return {};
+  if (a.form == Form::Integer && b.form == Form::Integer) {
+    return ofIntegers(type, a.integer, b.integer);
+  }
+  if (!isDoubleToo(a) || !isDoubleToo(b)) return {};
+  return ofDoubles(type, asDouble(a), asDouble(b));
+}
+
+template <class T>
+Scalar related(XQueryRelation relation, T a, T b) {
+  return Scalar::ofTruth(relation.holds(a < b ? -1 : a > b ? 1 : 0));
+}
+
+// Of typed numbers alone; no relation holds for what is not a number.
+Scalar comparison(int code, const Scalar& left, const Scalar& right) {
+  const Scalar a = numberIn(left, false);
+  const Scalar b = numberIn(right, false);
+  if (a.form == Form::Unknown || b.form == Form::Unknown) return {};
+  const XQueryRelation relation = XQueryRelationForCode(code);
+  if (a.form == Form::Integer && b.form == Form::Integer) {
+    return related(relation, a.integer, b.integer);
+  }
+  if (!isDoubleToo(a) || !isDoubleToo(b)) return {};
+  const double x = asDouble(a);
+  const double y = asDouble(b);
+  if (std::isnan(x) || std::isnan(y)) return Scalar::ofTruth(false);
+  return related(relation, x, y);
+}
+
+// The effective boolean value.
+Scalar truthOf(const Scalar& value) {
+  switch (value.form) {
+    case Form::Truth:
+      return value;
+    case Form::Integer:
+      return Scalar::ofTruth(value.integer != 0);
+    case Form::Double:
+      return Scalar::ofTruth(value.number != 0 && !std::isnan(value.number));
+    default:
+      return {};
+  }
+}
+
+// A position or a size of 0 was never set.
+Scalar placeInFocus(int64_t number) {
+  return number == 0 ? Scalar() : Scalar::ofInteger(number);
+}
+
+}  // namespace
+
+XQueryScalar XQueryScalar::ofInteger(int64_t value) {
+  XQueryScalar scalar;
+  scalar.form = Integer;
+  scalar.integer = value;
+  return scalar;
+}
+
+XQueryScalar XQueryScalar::ofDouble(double value) {
+  XQueryScalar scalar;
+  scalar.form = Double;
+  scalar.number = value;
+  return scalar;
+}
+
+XQueryScalar XQueryScalar::ofTruth(bool value) {
+  XQueryScalar scalar;
+  scalar.form = Truth;
+  scalar.truth = value;
+  return scalar;
+}
+
+XQueryScalar XQueryScalar::ofObject(const NSObject* value) {
+  XQueryScalar scalar;
+  if (value) {
+    scalar.form = Object;
+    scalar.object = value;
+  }
+  return scalar;
+}
+
+XQueryScalar XQueryScalarSteps::answer(const XQueryContext& context) const {
+  const Scalar last = valueOf(static_cast<Index>(_steps.size() - 1), context);
+  return last.form == Form::Object ? Scalar() : last;
+}
+
+XQueryScalar XQueryScalarSteps::valueOf(Index index, const XQueryContext& context) const {
+  const Step& step = _steps[index];
+  const auto& dynamic = _internal(context);
+  switch (step.kind) {
+    case Kind::Constant:
+      return step.constant;
+    case Kind::Variable:
+      return Scalar::ofObject(dynamic.variableForID(step.varID));
+    case Kind::ContextItem:
+      return Scalar::ofObject(dynamic.contextItem().get());
+    case Kind::Position:
+      return placeInFocus(dynamic.position());
+    case Kind::Last:
+      return placeInFocus(dynamic.last());
+    case Kind::Arithmetic:
+    case Kind::Comparison: {
+      const Scalar left = valueOf(step.left, context);
+      if (left.form == Form::Unknown) return left;
+      const Scalar right = valueOf(step.right, context);
+      return step.kind == Kind::Arithmetic ? arithmetic(step.code, left, right)
+                                           : comparison(step.code, left, right);
+    }
+    case Kind::And:
+    case Kind::Or:
+    case Kind::Not:
+      return logic(step, context);
+  }
+  return {};
+}
+
+// The operand behind one that decides is not looked at.
+XQueryScalar XQueryScalarSteps::logic(const Step& step, const XQueryContext& context) const {
+  if (step.kind == Kind::Not) {
+    const Scalar operand = truthOf(valueOf(step.right, context));
+    return operand.form == Form::Unknown ? operand : Scalar::ofTruth(!operand.truth);
+  }
+  const Scalar left = truthOf(valueOf(step.left, context));
+  if (left.form == Form::Unknown || left.truth == (step.kind == Kind::Or)) return left;
+  return truthOf(valueOf(step.right, context));
+}
+
+Value XQueryScalarExpr::computeValue(XQueryContext& context) const {
+  const Scalar answer = _steps.answer(context);
+  switch (answer.form) {
+    case Form::Integer:
+      return XQueryNumber::integerWithInt64(answer.integer);
+    case Form::Double:
+      return XQueryNumber::numberWithDouble(answer.number);
+    case Form::Truth:
+      return NSNumber::numberWithBool(answer.truth);
+    default:
+      return plain().evaluateWithContext(context);
+  }
+}
+
+}  // namespace xquery

@@ -1,0 +1,105 @@
+// Arithmetic, comparisons and logic over single numbers, computed with machine numbers: nothing
+// between the operands and the answer is made an object.
+//
+//   $i * 7919 mod 10007 = 0 or position() = 1
+//
+// Each step knows the integers of a machine word, doubles and truth values, and equals there what
+// the operator answers; wherever an operand is something else, an integer leaves its word, or there
+// would be an error, the whole expression is evaluated as it was written. Nothing that has been
+// looked at until then can be told.
+#pragma once
+
+#include "Plan/Operators/XQueryPlannedExpr.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <utility>
+#include <vector>
+
+namespace xquery {
+
+// A number, a truth value, or an object that has not been looked at. Unknown: it takes evaluating
+// the expression to tell.
+struct XQueryScalar {
+  enum Form : uint8_t { Unknown, Integer, Double, Truth, Object };
+
+  Form form = Unknown;
+  union {
+    int64_t integer = 0;
+    double number;
+    bool truth;
+    const NSObject* object;  // kept alive by whom it was taken from
+  };
+
+  static XQueryScalar ofInteger(int64_t value);
+  static XQueryScalar ofDouble(double value);
+  static XQueryScalar ofTruth(bool value);
+  static XQueryScalar ofObject(const NSObject* value);
+};
+
+// The steps of such a computation. Operands stand before what they are operands of.
+class XQueryScalarSteps {
+ public:
+  using Index = uint16_t;
+  // Steps nest no deeper, and are no more, than is worth it.
+  static constexpr size_t mostSteps = 64;
+
+  enum class Kind : uint8_t {
+    Constant,
+    Variable,  // local
+    ContextItem,
+    Position,
+    Last,
+    Arithmetic,  // code: the operator; a sign's left operand is the constant 0
+    Comparison,  // code: the value comparison
+    And,
+    Or,
+    Not,
+  };
+  struct Step {
+    Kind kind = Kind::Constant;
+    uint8_t code = 0;
+    Index left = 0;
+    Index right = 0;  // or the only one
+    int64_t varID = 0;
+    XQueryScalar constant{};
+  };
+
+  // The index of the step.
+  Index add(const Step& step) {
+    _steps.push_back(step);
+    return static_cast<Index>(_steps.size() - 1);
+  }
+  size_t count() const { return _steps.size(); }
+  const Step& operator[](size_t index) const { return _steps[index]; }
+
+  // What the last step comes to; Unknown, among others, for an object.
+  XQueryScalar answer(const XQueryContext& context) const;
+
+ private:
+  XQueryScalar valueOf(Index index, const XQueryContext& context) const;
+  XQueryScalar logic(const Step& step, const XQueryContext& context) const;
+
+  std::vector<Step> _steps;
+};
+
+class XQueryScalarExpr : public XQueryPlannedExpr {
+ public:
+  [[nodiscard]] static Ref<XQueryScalarExpr> exprWithPlain(Ref<XQueryExpr> plain,
+                                                           XQueryScalarSteps steps) {
+    return make<XQueryScalarExpr>(std::move(plain), std::move(steps));
+  }
+
+  Value computeValue(XQueryContext& context) const override;
+
+ protected:
+  XQueryScalarExpr(Ref<XQueryExpr> plain, XQueryScalarSteps steps)
+      : XQueryPlannedExpr(std::move(plain)), _steps(std::move(steps)) {}
+  template <class T, class... Arguments>
+  friend Ref<T> make(Arguments&&...);
+
+ private:
+  const XQueryScalarSteps _steps;
+};
+
+}  // namespace xquery

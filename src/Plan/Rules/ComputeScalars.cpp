@@ -1,0 +1,206 @@
+// Arithmetic, comparisons and logic over single numbers.
+//
+// Pattern     an operator of arithmetic, a value or general comparison, "and", "or" and not() over
+//             others of these, local variables, ".", position(), last() and numbers; arithmetic of
+//             one operator alone gains nothing
+// Facts       of a variable and of ".": it may be a number, or untyped in arithmetic; compared, it
+//             is surely one; and no other rule has put something in the place of a part
+// Operator    XQueryScalarExpr
+// Why         looking at variables and the focus cannot fail and leaves nothing behind, so that the
+//             expression can still be evaluated as a whole wherever machine numbers do not tell
+#include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/XQueryLeaves.h"
+#include "Functions/Boolean.h"
+#include "Functions/Context.h"
+#include "Functions/XQueryFunctionCall.h"
+#include "Plan/Operators/XQueryScalarExpr.h"
+#include "Plan/Planning.h"
+#include "Plan/Rules.h"
+#include "Plan/Rules/PlaceInside.h"
+#include "Types/XQueryNumericOperand.h"
+
+#include <optional>
+#include <utility>
+#include <vector>
+
+namespace xquery {
+namespace {
+
+using Steps = XQueryScalarSteps;
+using StepKind = XQueryScalarSteps::Kind;
+using Added = std::optional<Steps::Index>;
+
+// What an operand is for.
+enum class Use : uint8_t { Arithmetic, Comparison, Logic };
+
+// The classes of operators, as XQueryOperatorExpr::operatorClassification numbers them.
+constexpr int logicalClass = 1, arithmeticClass = 2, valueClass = 5, generalClass = 6;
+
+class Compiler {
+ public:
+  explicit Compiler(const XQueryPlanning& planning)
+      : _planning(planning), _program(planning.program) {}
+
+  // The steps that the place comes to, where computing them gains something.
+  std::optional<Steps> stepsAt(XQueryPlaceID place) {
+    if (!addOperation(place, 0)) return std::nullopt;
+    const StepKind last = _steps[_steps.count() - 1].kind;
+    if (last == StepKind::Arithmetic && _operations < 2) return std::nullopt;
+    return std::move(_steps);
+  }
+
+ private:
+  Added addOperand(XQueryPlaceID place, Use use, int level) {
+    place = XQueryPlaceInside(_program, place);
+    if (place == XQueryNoPlace || _steps.count() + 1 >= Steps::mostSteps) return std::nullopt;
+    const Ref<XQueryExpr> expr = _planning.exprAt(place);
+    if (const auto* literal = dyn_cast<XQueryLiteral>(expr.get())) return addLiteral(*literal, use);
+    if (expr.get() != _program[place].expr) return std::nullopt;
+    if (const Added leaf = addLeaf(place, *expr, use)) return leaf;
+    return use != Use::Logic && isTruth(*expr) ? std::nullopt : addOperation(place, level);
+  }
+
+  Added addLiteral(const XQueryLiteral& literal, Use use) {
+    if (use == Use::Logic || !literal.literalValue()) return std::nullopt;
+    const auto number = XQueryNumericOperand::of(literal.literalValue().get(), false);
+    Steps::Step step;
+    if (number.form == XQueryNumericOperand::Double) {
+      step.constant = XQueryScalar::ofDouble(number.number);
+    } else if (number.form == XQueryNumericOperand::Exact && number.isInteger &&
+               number.exact->isSmallInteger()) {
+      step.constant = XQueryScalar::ofInteger(number.exact->smallInteger());
+    } else {
+      return std::nullopt;
+    }
+    return _steps.add(step);
+  }
+
+  Added addLeaf(XQueryPlaceID place, const XQueryExpr& expr, Use use) {
+    Steps::Step step;
+    if (const auto* call = dyn_cast<XQueryFunctionCall>(&expr)) {
+      const bool isBare = call->builtIn() && (!call->args() || call->args()->count() == 0);
+      if (!isBare || (call->function() != fn_position && call->function() != fn_last)) {
+        return std::nullopt;
+      }
+      step.kind = call->function() == fn_position ? StepKind::Position : StepKind::Last;
+      return _steps.add(step);
+    }
+    const auto* variable = dyn_cast<XQueryVariable>(&expr);
+    if (use == Use::Logic || (!variable && !isa<XQueryContextItem>(&expr))) return std::nullopt;
+    if (variable && variable->varID() <= 0) return std::nullopt;
+    const XQueryFacts& facts = _planning.facts[place];
+    constexpr auto numbers = XQueryItems::Integer | XQueryItems::Double;
+    const bool fits = use == Use::Comparison
+                          ? facts.are(XQueryItems::Numeric) && facts.mayBe(numbers)
+                          : facts.mayBe(numbers | XQueryItems::Untyped | XQueryItems::Node);
+    if (!fits) return std::nullopt;
+    step.kind = variable ? StepKind::Variable : StepKind::ContextItem;
+    step.varID = variable ? variable->varID() : 0;
+    return _steps.add(step);
+  }
+
+  static bool isTruth(const XQueryExpr& expr) {
+    const auto* operation = dyn_cast<XQueryOperatorExpr>(&expr);
+    return !operation ||
+           XQueryOperatorExpr::operatorClassification(operation->operatorType()) != arithmeticClass;
+  }
+
+  Added addOperation(XQueryPlaceID place, int level) {
+    constexpr int mostLevels = 16;
+    if (level > mostLevels) return std::nullopt;
+    const Ref<XQueryExpr> expr = _planning.exprAt(place);
+    if (const auto* call = dyn_cast<XQueryFunctionCall>(expr.get())) {
+      const bool isNot = call->builtIn() && call->function() == fn_not && call->args() &&
+                         call->args()->count() == 1;
+      const XQueryPlaceID list = _program.firstPart(place);
+      if (!isNot || list == XQueryNoPlace) return std::nullopt;
+      return addOf(StepKind::Not, 0, {}, _program.firstPart(list), Use::Logic, level);
+    }
+    const auto* operation = dyn_cast<XQueryOperatorExpr>(expr.get());
+    if (!operation) return std::nullopt;
+    const XQueryPlaceID first = _program.firstPart(place);
+    if (first == XQueryNoPlace) return std::nullopt;
+    const XQueryPlaceID second = _program.nextPart(first);
+    const int type = operation->operatorType();
+    const auto code = static_cast<uint8_t>(type);
+    // A quotient of integers is a decimal.
+    if (type == XQueryOperatorDiv && areExact(first) && areExact(second)) return std::nullopt;
+    switch (XQueryOperatorExpr::operatorClassification(type)) {
+      case logicalClass: {
+        const auto kind = type == XQueryOperatorAnd ? StepKind::And : StepKind::Or;
+        return addOf(kind, 0, first, second, Use::Logic, level);
+      }
+      case arithmeticClass:
+        return operation->isSign()
+                   ? addSign(code, first, level)
+                   : addOf(StepKind::Arithmetic, code, first, second, Use::Arithmetic, level);
+      case valueClass:
+        return addOf(StepKind::Comparison, code, first, second, Use::Comparison, level);
+      case generalClass: {
+        constexpr int distance = XQueryOperatorEq - XQueryOperatorEqual;
+        return addOf(StepKind::Comparison, static_cast<uint8_t>(type + distance), first, second,
+                     Use::Comparison, level);
+      }
+      default:
+        return std::nullopt;
+    }
+  }
+
+  bool areExact(XQueryPlaceID place) const {
+    return _planning.facts[place].are(XQueryItems::AnyDecimal);
+  }
+
+  // A sign adds to nothing, or takes from it.
+  Added addSign(uint8_t code, XQueryPlaceID operand, int level) {
+    Steps::Step step{StepKind::Arithmetic, code};
+    Steps::Step nothing;
+    nothing.constant = XQueryScalar::ofInteger(0);
+    step.left = _steps.add(nothing);
+    return addWith(step, operand, Use::Arithmetic, level);
+  }
+
+  Added addOf(StepKind kind, uint8_t code, std::optional<XQueryPlaceID> left, XQueryPlaceID right,
+              Use use, int level) {
+    Steps::Step step{kind, code};
+    if (left) {
+      const Added added = addOperand(*left, use, level + 1);
+      if (!added) return added;
+      step.left = *added;
+    }
+    return addWith(step, right, use, level);
+  }
+
+  Added addWith(Steps::Step step, XQueryPlaceID right, Use use, int level) {
+    const Added added = addOperand(right, use, level + 1);
+    if (!added) return added;
+    step.right = *added;
+    ++_operations;
+    return _steps.add(step);
+  }
+
+  const XQueryPlanning& _planning;
+  const XQueryProgram& _program;
+  Steps _steps;
+  int _operations = 0;
+};
+
+}  // namespace
+
+void XQueryComputeScalars(XQueryPlanning& planning) {
+  const XQueryProgram& program = planning.program;
+  // Wholes stand before their parts, which are done with them.
+  std::vector<bool> areDone(program.placeCount());
+  for (XQueryPlaceID place = 0; place < program.placeCount(); ++place) {
+    const XQueryPlaceID whole = program[place].parent;
+    areDone[place] = whole != XQueryNoPlace && areDone[whole];
+    if (areDone[place] || !planning.isOpen(place)) continue;
+    if (planning.exprAt(place).get() != program[place].expr) continue;
+    auto steps = Compiler(planning).stepsAt(place);
+    if (!steps) continue;
+    areDone[place] = true;
+    planning.wrap(place,
+                  XQueryScalarExpr::exprWithPlain(planning.exprAt(place), std::move(*steps)));
+  }
+}
+
+}  // namespace xquery
