@@ -172,7 +172,11 @@ const XQueryProgramBody* XQueryProgram::bodyOfFunction(const XQueryFunctionDecl*
   return found == _bodies.end() ? nullptr : &*found;
 }
 
+// Rules look through the parts of a whole for each of these, which of thousands takes seconds: here
+// is where the limits of a compilation end that.
 XQueryPlaceID XQueryProgram::nextPart(XQueryPlaceID place) const {
+  static constinit thread_local WorkPacer pacer;
+  pacer.turn();
   const XQueryPlaceID whole = _places[place].parent;
   const XQueryPlaceID next = _places[place].end;
   return whole != XQueryNoPlace && next < _places[whole].end ? next : XQueryNoPlace;

@@ -1,6 +1,7 @@
 #include "Plan/Joins/XQueryJoinedSteps.h"
 
 #include "Plan/Paths/XQueryWalkedPath.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
 
@@ -16,8 +17,12 @@ bool staysInside(int axis) {
 std::vector<XQueryPlaceID> XQueryPredicatesOf(const XQueryPlanning& planning, XQueryPlaceID path,
                                               const XQueryStep& step, size_t first) {
   std::vector<XQueryPlaceID> places;
-  for (XQueryPlaceID part = planning.program.firstPart(path); part != XQueryNoPlace;
+  if (step.predicates().empty()) return places;
+  WorkPacer pacer;
+  for (XQueryPlaceID part = planning.program.firstPart(path);
+       part != XQueryNoPlace && places.size() < step.predicates().size();
        part = planning.program.nextPart(part)) {
+    pacer.turn();
     const XQueryPlace& at = planning.program[part];
     if (at.step == &step && at.role == XQueryRole::Predicate) places.push_back(part);
   }

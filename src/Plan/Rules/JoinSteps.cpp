@@ -19,6 +19,7 @@
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 #include "Plan/Rules/PathAt.h"
+#include "Platform/Base/WorkMeter.h"
 
 #include <utility>
 #include <vector>
@@ -35,7 +36,11 @@ XQueryJoinCondition conditionOf(const XQueryPlanning& planning,
   const XQueryJoinSearch search(planning, scope, {});
   XQueryJoinCondition condition;
   condition.isWhole = true;
-  for (const XQueryPlaceID place : places) condition.join(search.conditionIn(place, true));
+  for (const XQueryPlaceID place : places) {
+    condition.join(search.conditionIn(place, true));
+    constexpr size_t termsPerStep = 64;  // they are put in order each time
+    checkWork(1 + condition.terms.size() / termsPerStep);
+  }
   return condition;
 }
 

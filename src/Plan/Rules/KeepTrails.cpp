@@ -18,6 +18,7 @@
 
 #include <algorithm>
 #include <string_view>
+#include <unordered_map>
 #include <vector>
 
 namespace xquery {
@@ -76,13 +77,16 @@ class Search {
         _steps(path.changeableSteps()),
         _predicates(_steps.size()),
         _of(_steps.size()) {
+    std::unordered_map<const XQueryStep*, size_t> indexes;
+    for (size_t i = 0; i < _steps.size(); ++i) indexes.emplace(_steps[i].step, i);
     for (XQueryPlaceID part = planning.program.firstPart(place); part != XQueryNoPlace;
          part = planning.program.nextPart(part)) {
       const XQueryPlace& at = planning.program[part];
-      const XQueryWalkedStep* step = at.step ? path.walked(*at.step) : nullptr;
-      if (!step) continue;
-      if (at.role == XQueryRole::Step && step->isExpression()) _expressions.push_back(part);
-      if (at.role == XQueryRole::Predicate) _predicates[indexOf(*step)].push_back(part);
+      const auto found = at.step ? indexes.find(at.step) : indexes.end();
+      if (found == indexes.end()) continue;
+      const size_t index = found->second;
+      if (at.role == XQueryRole::Step && _steps[index].isExpression()) _expressions.push_back(part);
+      if (at.role == XQueryRole::Predicate) _predicates[index].push_back(part);
     }
   }
 

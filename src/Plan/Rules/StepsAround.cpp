@@ -2,6 +2,7 @@
 
 #include "Plan/Paths/XQueryWalkedPath.h"
 #include "Plan/Planning.h"
+#include "Platform/Base/WorkMeter.h"
 
 namespace xquery {
 
@@ -14,7 +15,9 @@ bool XQueryHidesFocusOf(const XQueryStep& step, const XQueryWalkedPath& path, XQ
     if (!items.are(XQueryItems::Node) && items.most > 1) return false;
   }
   bool isPassed = path.start() == &step;
+  WorkPacer pacer;
   for (const XQueryWalkedStep& each : path.steps()) {
+    pacer.turn();
     if (each.testMayRaise) return false;
     if (each.isExpression() && each.step != &step && !isPassed) return false;
     isPassed = isPassed || each.step == &step;
