@@ -24,31 +24,31 @@ Failure wrongPath(const std::string& what) {
   return {StatusQueryError, "xquery: --split: the path gives " + what, {}};
 }
 
-// The elements that the node is in, from the document element on.
-std::vector<const NSXMLElement*> elementsAround(const NSXMLNode& node) {
-  std::vector<const NSXMLElement*> found;
-  for (const NSXMLNode* each = node.parent(); each; each = each->parent()) {
-    if (const auto* element = dyn_cast<NSXMLElement>(each)) found.push_back(element);
-  }
-  std::reverse(found.begin(), found.end());
-  return found;
-}
-
 }  // namespace
 
 Pieces::Pieces(std::string folder, uint64_t records, Receiver receive)
     : _folder(std::move(folder)), _records(records), _receive(std::move(receive)) {}
 
 void Pieces::beginRecord(const NSXMLElement& record, size_t elementsKept) {
-  _document = record.rootDocument();
   for (size_t depth = elementsKept; depth < _open.size(); ++depth) _open[depth].element = nullptr;
   _last = nullptr;
+  _document = record.rootDocument();
+  _line.clear();
+  _onLine.clear();
 }
 
-bool Pieces::isInLast(const NSXMLElement& element) const {
-  const NSXMLNode* node = _last ? &element : nullptr;
-  while (node && node != _last) node = node->parent();
-  return node != nullptr;
+// False where the element is in another tree.
+bool Pieces::goTo(const NSXMLElement& element) {
+  if (_line.empty()) _line.push_back(_document);
+  _onLine.insert(_document);
+  std::vector<const NSXMLNode*> below;
+  const NSXMLNode* node = &element;
+  for (; node && !_onLine.contains(node); node = node->parent()) below.push_back(node);
+  if (!node) return false;
+  for (; _line.back() != node; _line.pop_back()) _onLine.erase(_line.back());
+  _onLine.insert(below.begin(), below.end());
+  _line.insert(_line.end(), below.rbegin(), below.rend());
+  return true;
 }
 
 void Pieces::add(const NSObject& item) {
@@ -56,17 +56,14 @@ void Pieces::add(const NSObject& item) {
   if (!element) {
     throw wrongPath("an item of type " + XQueryItemTypeName(item) + ", which is no element");
   }
-  const NSXMLDocument* document = element->rootDocument();
-  if (!document || document != _document) {
-    throw wrongPath("an element that is not the document's");
-  }
-  if (isInLast(*element)) return;
+  if (!goTo(*element)) throw wrongPath("an element that is not the document's");
+  if (_last && _onLine.contains(_last)) return;
   if (_last && NSXMLNode::compareOrder(_last, element) >= 0) {
     throw wrongPath("elements in another order than the document's");
   }
   _last = element;
   if (!_output) open();
-  enter(elementsAround(*element));
+  enterRecord();
   XQueryWriteXMLInPlace(*element, [this](std::string_view text) { return write(text); });
   write("\n");
   if (!_output->error().empty()) throw writingFailure(_path, _output->error());
@@ -74,16 +71,19 @@ void Pieces::add(const NSObject& item) {
 }
 
 // Ends the elements that the record is not in, and begins those that it is in.
-void Pieces::enter(const std::vector<const NSXMLElement*>& above) {
+void Pieces::enterRecord() {
+  const auto elementAt = [this](size_t depth) { return cast<NSXMLElement>(_line[1 + depth]); };
+  const size_t above = _line.size() - 2;  // neither the document nor the record
   size_t common = 0;
-  while (common < std::min(_open.size(), above.size()) && _open[common].element == above[common]) {
+  while (common < std::min(_open.size(), above) && _open[common].element == elementAt(common)) {
     ++common;
   }
   leaveTo(common);
-  for (; common < above.size(); ++common) {
-    XQueryWriteStartTag(*above[common], [this](std::string_view text) { return write(text); });
+  for (; common < above; ++common) {
+    const NSXMLElement* element = elementAt(common);
+    XQueryWriteStartTag(*element, [this](std::string_view text) { return write(text); });
     write("\n");
-    _open.push_back({above[common], above[common]->nameView().utf8()});
+    _open.push_back({element, element->nameView().utf8()});
   }
 }
 

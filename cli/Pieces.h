@@ -14,6 +14,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <unordered_set>
 #include <vector>
 
 namespace cli {
@@ -36,8 +37,8 @@ class Pieces {
   void finish();
 
  private:
-  bool isInLast(const xquery::NSXMLElement& element) const;
-  void enter(const std::vector<const xquery::NSXMLElement*>& above);
+  bool goTo(const xquery::NSXMLElement& element);
+  void enterRecord();
   void open();
   void close();
   void leaveTo(size_t depth);
@@ -59,6 +60,11 @@ class Pieces {
   std::vector<Open> _open;
   const xquery::NSXMLDocument* _document = nullptr;  // that is cut
   const xquery::NSXMLElement* _last = nullptr;       // that was added within the record
+  // Within the record, from the document down to the last item, each in the next. The next item is
+  // looked for from itself upward, to the first one that it has in common with this one: so items
+  // that lie in each other cost nothing for their depth.
+  std::vector<const xquery::NSXMLNode*> _line;
+  std::unordered_set<const xquery::NSXMLNode*> _onLine;
 };
 
 }  // namespace cli

@@ -111,6 +111,17 @@ TEST(SplitCommand, WritesNothingTwice) {
                    declaration + "<a>\n<b><c><b/></c></b>\n</a>\n"}));
 }
 
+// A look at all that is above each of them would take minutes.
+TEST(SplitCommand, PassesOverElementsWithinARecordHoweverDeepTheyAre) {
+  constexpr size_t depth = 200'000;
+  std::string begin, end;
+  for (size_t i = 0; i < depth; ++i) begin += "<b>", end += "</b>";
+  const std::string record = begin + "x" + end;
+  const std::string text = "<a>" + record + "<b/></a>";
+  EXPECT_EQ(pieces("//b", "5", text, {"--timeout", "20"}),
+            (Texts{declaration + "<a>\n" + record + "\n<b/>\n</a>\n"}));
+}
+
 TEST(SplitCommand, WritesNoOtherThingsThanElementsOfTheDocument) {
   const std::string text = "<a><b i='1'/></a>";
   for (const auto& [path, type] :
