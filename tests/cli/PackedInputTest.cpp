@@ -55,6 +55,14 @@ TEST(PackedInput, ThatIsDamagedIsThree) {
     EXPECT_EQ(xquery({"-e", "1", "-"}, packed.substr(0, packed.size() - 3)).err,
               "xquery: standard input: " + message);
     EXPECT_EQ(xquery({"-e", "1", "-"}, packed + "more").status, 3);
+    // A stream has seen the whole document by then.
+    for (const std::string& damaged : {packed.substr(0, packed.size() - 3), packed + "more"}) {
+      const Outcome stream = xquery({"--stream", "-e", "count(//b)", "-"}, damaged);
+      EXPECT_EQ(stream.status, 3) << format.name;
+      EXPECT_EQ(stream.err, xquery({"-e", "count(//b)", "-"}, damaged).err) << format.name;
+    }
+    // What has been found without going on to the end stands.
+    EXPECT_EQ(xquery({"--stream", "-e", "exists(//b)", "-"}, packed + "more").out, "true\n");
     const std::string bad = directory.write("bad", format.pack("<a>"));
     EXPECT_THAT(xquery({"-e", "1", bad}).err, testing::StartsWith(bad + ":1:4: Premature end"));
   }

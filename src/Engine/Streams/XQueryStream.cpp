@@ -130,8 +130,9 @@ class Stream {
     NSXMLParseError error;
     const bool isWellFormed = evaluateAll(records, error);
     if (_hasFailed) return {};
+    // The document may be whole where what it is packed in is not.
+    if (!_isDecided && !unpacked.failure().empty()) return fail(unpacked.failure());
     if (!isWellFormed) {
-      if (!unpacked.failure().empty()) return fail(unpacked.failure());
       _failure.reading = error;
       return {};
     }
