@@ -41,7 +41,6 @@ std::string applyToItem() {
 std::vector<LimitRow> programRows() {
   return {
       // --- recursion
-      // -------------------------------------------------------------------------------
       {"recursion: endless", "declare function local:f($n) { local:f($n + 1) + 1 }; local:f(1)"},
       {"recursion: endless, with a loop",
        "declare function local:f($n) { for $x in ($n, 1) return local:f($x) + 1 }; local:f(1)"},
@@ -60,7 +59,6 @@ std::vector<LimitRow> programRows() {
        "declare function local:f($n) { if ($n = 0) then count((1 to 100000000)[. < 'a']) else "
        "local:f($n - 1) + 1 }; local:f(50000)"},
       // --- inner queries
-      // ---------------------------------------------------------------------------
       {"inner: one tag of many attributes",
        "ext:eval(concat('<a ', string-join(for $i in 1 to 400000 return concat('a', $i, "
        "'=&quot;&quot;'), ' '), '/>'))"},
@@ -102,7 +100,6 @@ std::vector<LimitRow> programRows() {
        "replace($q, '&quot;', '&quot;&quot;'), '&quot;)'), $n - 1) }; ext:eval(local:f('1', 20))"},
       {"inner: for each node", "count(//b[ext:node-xquery(., 'count(//b)') = 0])", {}, wide},
       // --- stylesheets
-      // -----------------------------------------------------------------------------
       {"stylesheet: doubling work", apply,
        [] { return recursive("<xsl:if test='$n'>" + again + again + "</xsl:if>"); }},
       {"stylesheet: doubling output", apply,
@@ -159,7 +156,6 @@ std::vector<LimitRow> programRows() {
       {"stylesheet: imports itself", apply,
        [] { return stylesheet("<xsl:import href='app:b'/>"); }},
       // --- loading
-      // ---------------------------------------------------------------------------------
       {"load: a silent host", "count(doc('silent:a'))"},
       {"load: a silent server", "count(doc('SILENT-SERVER'))"},
       {"load: an endless answer", "count(doc('ENDLESS-SERVER'))"},
@@ -170,7 +166,6 @@ std::vector<LimitRow> programRows() {
       {"load: large bodies", "for $i in 1 to 100000000 return ext:uri-body(concat('app:', $i))",
        [] { return std::string(1'000'000, 'x'); }},
       // --- compiling
-      // -------------------------------------------------------------------------------
       {"compile: a query of 6 MB",
        [] { return "1" + repeated(" + 1", 1'500'000); },
        {},
@@ -208,6 +203,21 @@ std::vector<LimitRow> programRows() {
        Door::Compile},
       {"compile: blanks before an error",
        [] { return std::string(50'000'000, '\n') + "<"; },
+       {},
+       {},
+       Door::Compile},
+      {"compile: steps that are expressions",
+       [] { return repeated("a/(b)/", 100'000) + "a"; },
+       {},
+       {},
+       Door::Compile},
+      {"compile: predicates of one step",
+       [] { return "a" + repeated("[b = 1]", 100'000); },
+       {},
+       {},
+       Door::Compile},
+      {"compile: clauses",
+       [] { return repeated("let $x := a[b] ", 100'000) + "return $x"; },
        {},
        {},
        Door::Compile},

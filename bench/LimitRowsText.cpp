@@ -21,7 +21,6 @@ constexpr const char* wide = "&#233;123456789abcdef";
 std::vector<LimitRow> textRows() {
   return {
       // --- one pass
-      // --------------------------------------------------------------------------------
       {"text: doubling", "declare function local:f($s) { local:f(concat($s, $s)) }; local:f('ab')"},
       {"text: string-join, wide",
        [] { return longText() + "return string-length(string-join(($s, '&#233;'), ''))"; }},
@@ -100,7 +99,6 @@ std::vector<LimitRow> textRows() {
       {"text: concat of many",
        [] { return "string-length(concat('a'" + repeated(", 'b@'", 20'000) + "))"; }},
       // --- patterns
-      // ----------------------------------------------------------------------------------
       {"pattern: backtracking",
        [] { return "matches('" + std::string(5000, 'a') + "', '(a+)+b')"; }},
       {"pattern: backtracking often",

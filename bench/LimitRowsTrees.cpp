@@ -30,7 +30,6 @@ constexpr const char* often = "for $i in 1 to 1000000 ";
 std::vector<LimitRow> treeRows() {
   return {
       // --- walks
-      // -----------------------------------------------------------------------------------
       {"walk: descendants", "for $i in 1 to 1000000 return count(//missing)", {}, wide},
       {"walk: siblings", "count(//e[count(following-sibling::e) < 0])", {}, wide},
       {"walk: preceding", "count(//e[preceding::missing])", {}, wide},
@@ -84,7 +83,6 @@ std::vector<LimitRow> treeRows() {
        {},
        keyed},
       // --- constructors
-      // ----------------------------------------------------------------------------
       {"make: elements", "count(<a>{for $i in 1 to 30000000 return <b/>}</a>/b)"},
       {"make: attributes",
        "count(<a>{for $i in 1 to 1000000 return attribute {concat('a', $i)} {$i}}</a>/@*)"},
@@ -106,7 +104,6 @@ std::vector<LimitRow> treeRows() {
        "count(<a>{for $i in 1 to 10000000 return element {concat('e', $i)} {()}}</a>)"},
       {"make: documents", "count(for $i in 1 to 10000000 return document {<a/>})"},
       // --- writing
-      // ---------------------------------------------------------------------------------
       {"write: wide",
        "for $i in 1 to 1000000 return string-length(ext:string-from-node(/))",
        {},
@@ -125,7 +122,6 @@ std::vector<LimitRow> treeRows() {
        {},
        wide},
       // --- giving back
-      // -----------------------------------------------------------------------------
       {"free: list",
        "let $s := for $i in 1 to 3000000 return concat('a', $i) for $i in 1 to 100000000 where $i "
        "< 0 return $s"},

@@ -20,7 +20,6 @@ constexpr const char* often = "for $i in 1 to 1000000 ";
 std::vector<LimitRow> valueRows() {
   return {
       // --- decimals of 120,000 digits, whose products are still decimals
-      // --------------------------------------------------------------
       {"decimal: value comparison",
        [] { return twoDecimals() + often + "where $a eq $b return $i"; }},
       {"decimal: with an integer",
@@ -61,7 +60,6 @@ std::vector<LimitRow> valueRows() {
       {"decimal: from megabytes",
        [] { return doubledText("1234567890123456", 19) + "return xs:integer($s) = 0"; }},
       // --- numbers and dates from long texts
-      // -------------------------------------------------------
       {"number: digits", [] { return doubledText("1234567890123456", 22) + "return number($s)"; }},
       {"number: fraction",
        [] { return doubledText("0000000000000000", 22) + "return number(concat('0.', $s))"; }},
@@ -98,7 +96,6 @@ std::vector<LimitRow> valueRows() {
        "for $i in 1 to 10000000 where adjust-dateTime-to-timezone(current-dateTime(), "
        "xdt:dayTimeDuration('PT5H')) < current-dateTime() and $i < 0 return $i"},
       // --- URIs
-      // ------------------------------------------------------------------------------------
       {"uri: cast of slashes",
        [] {
          return doubledText("////////////////", 20) +
@@ -146,7 +143,6 @@ std::vector<LimitRow> valueRows() {
                 "where string-length(escape-uri($s, true())) = 0 return $i";
        }},
       // --- names and binaries
-      // ------------------------------------------------------------------------
       {"name: castable as NCName",
        [] {
          return doubledText("abcdefghijklmnop", 20) + often +
