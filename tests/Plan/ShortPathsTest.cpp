@@ -1,5 +1,6 @@
 // The smallest of paths and comparisons.
 #include "Plan/PlanTesting.h"
+#include "Platform/Base/ProcessorTime.h"
 
 namespace xquery {
 namespace {
@@ -209,6 +210,68 @@ TEST(ConstantComparisons, ReadLongTextsAndManyNodes) {
        {"for $x in /a return ($x/b = 1999, $x/b = '1999', $x/b = -1, $x/b != 5, $x/b < 0)",
         "for $x in /a return ($x/c = '1', $x/c > '1', $x/c > 1e300)"}) {
     sameBothWays(query, many);
+  }
+}
+
+// --- names that no node has two children of ------------------------------------------------------
+
+// "one" and "last" below each "e", the one first and the other last, with others between them; of
+// "many" there are several.
+const Value& entries() {
+  static const Value parsed = [] {
+    std::string xml = "<r xmlns:p='urn:p'>";
+    for (int i = 0; i < 60; ++i) {
+      xml += "<e><one id='" + std::to_string(i) + "'>" + std::to_string(i % 7) + "</one><many/>";
+      xml += i % 3 ? "<p:one/><f><one/></f>" : "<g/>";
+      xml += i % 5 ? "<many>x</many>t<last/></e>" : "<last>3</last>t</e>";
+    }
+    return document(xml + "</r>");
+  }();
+  return parsed;
+}
+
+TEST(SingleNames, AreFoundAsAllOthers) {
+  for (const std::string path :
+       {"one", "last", "many", "one/@id", "f/one", "one/text()", "none", "one[. = '3']", "last[1]",
+        "many[2]", "*/one", "p:one", "one/.."}) {
+    for (const std::string context :
+         {"for $e in //e return $e/#", "//e/#", "count(//e/#)", "for $e in //e return count($e/#)",
+          "//e[#]/one/@id", "for $e in //e where $e/# = '3' return $e/one/@id",
+          "for $e in //e order by string($e/#[1]) return $e/last", "//one[../#]"}) {
+      std::string query = context;
+      query.replace(query.find('#'), 1, path);
+      sameBothWays("declare namespace p = 'urn:p'; " + query, entries());
+    }
+  }
+}
+
+// What is built around them while they are looked for may have any number.
+TEST(SingleNames, AreForgottenInWhatAQueryBuilds) {
+  for (const char* query :
+       {"let $e := <e>{//e[position() < 90], <one/>, <one/>}</e> return (count($e/one), $e/e/one)",
+        "let $d := document { (//e, //e) } return (count($d/e/one), count($d/e), $d/e[2]/one/@id)",
+        "for $e in <r>{//r/node(), <e><one/>{//one[1]}</e>}</r>/e return count($e/one)"}) {
+    EXPECT_FALSE(sameBothWays(query, entries()).lines.empty()) << query;
+  }
+}
+
+TEST(SingleNames, EndTheWalkForThem) {
+  std::string wide = "<r><first/>";
+  for (int i = 0; i < 2000; ++i) wide += "<other/>";
+  wide += "<last/></r>";
+  std::string xml = "<s>";
+  for (int i = 0; i < 100; ++i) xml += wide;
+  const Value rows = document(xml + "</s>");
+  for (const std::string path : {"$r/#/@id", "$r/#[not(@id)]"}) {
+    const auto secondsFor = [&](const std::string& name) {
+      std::string text = "for $r in /s/r return count(" + path + ")";
+      text.replace(text.find('#'), 1, name);
+      const auto query = compiled(text, XQueryWay::Planned);
+      const auto context = XQueryContext::xqueryContext();
+      return processorSecondsOf([&] { EXPECT_TRUE(context->evaluateXQuery(*query, {}, rows)); });
+    };
+    static_cast<void>(secondsFor("last"));
+    EXPECT_LT(secondsFor("first"), secondsFor("last") / 2) << path;
   }
 }
 

@@ -5,12 +5,14 @@
 // node stand in their order, the subtrees of two siblings do not meet, and attributes have no
 // children. So there is nothing to sort and nothing to look for twice. Ancestors and preceding
 // siblings come the nearest first, as a path answers them; what is found from several ancestors
-// comes once, but in another order than that of the path.
+// comes once, but in another order than that of the path. Where the tree is known to have no two
+// siblings of a name (Platform/Tree/SingleNames.h), the walk for it ends with the first one.
 #pragma once
 
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryAxisWalk.h"
 #include "Expr/Paths/XQueryPathRun.h"
+#include "Platform/Tree/TreeIndexes.h"
 #include "xquery/XMLNode.h"
 
 #include <algorithm>
@@ -105,9 +107,14 @@ class XQueryShortWalk {
     if (index == _count) return visit(node);
     const Step& step = _steps[index];
     bool goesOn = true;
+    // Asked of the first one that is found.
+    bool mayBeSingle = step.axis == XQueryAxisChild && step.name;
     const auto take = [&](NSXMLNode* found) {
-      if (step.takes(found)) goesOn = visitFrom(index + 1, found, visit);
-      return goesOn;
+      if (!step.takes(found)) return true;
+      goesOn = visitFrom(index + 1, found, visit);
+      if (!goesOn || !mayBeSingle || !found->nextSibling()) return goesOn;
+      mayBeSingle = NSXMLTreeIndexes::isSingle(found);
+      return !mayBeSingle;
     };
     if (step.axis == XQueryAxisChild) {
       XQueryWalkSiblings(node->firstChild(), take);

@@ -20,15 +20,21 @@ void XQueryVisitIndexed(const NSXMLIndexedNodes& indexed, Act act) {
   }
 }
 
-// Does something with the elements and attributes of a name and passes over all other nodes.
+// Does something with the elements and attributes of a name and passes over all other nodes. Of the
+// children of a node, those behind the only one of the name are not looked at.
 template <class Act>
 class XQueryNamedVisit {
  public:
-  XQueryNamedVisit(const NSXMLExpandedName* name, Act act) : _name(name), _act(act) {}
+  XQueryNamedVisit(const NSXMLExpandedName* name, int axis, Act act)
+      : _name(name), _areChildren(axis == XQueryAxisChild), _act(act) {}
 
   bool operator()(NSXMLNode* found) {
     const bool isNamed = found->kind() == Kind::Element || found->kind() == Kind::Attribute;
-    return !isNamed || found->expandedName() != _name || _act(found);
+    if (!isNamed || found->expandedName() != _name) return true;
+    if (!_act(found)) return false;
+    if (!_areChildren || !found->nextSibling()) return true;
+    _areChildren = NSXMLTreeIndexes::isSingle(found);
+    return !_areChildren;
   }
   // In place of a walk, which would meet no attributes.
   bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
@@ -46,6 +52,7 @@ class XQueryNamedVisit {
 
  private:
   const NSXMLExpandedName* _name;
+  bool _areChildren;  // of which the first may be the only one
   Act _act;
 };
 

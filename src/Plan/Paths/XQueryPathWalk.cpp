@@ -332,7 +332,8 @@ void XQueryPathWalk::stream(size_t index, int axis, NSXMLNode* node) {
   if ((isNamed || !_steps[index].testMayRaise) && onlyCounts(index, axis, node)) {
     count(_steps[index], axis, node);
   } else if (name) {
-    streamMatching(index, axis, node, [name](auto act) { return XQueryNamedVisit(name, act); });
+    streamMatching(index, axis, node,
+                   [name, axis](auto act) { return XQueryNamedVisit(name, axis, act); });
   } else if (test.onlyNames()) {
     streamMatching(index, axis, node, [&test](auto act) { return XQueryChoiceVisit(test, act); });
   } else {
@@ -450,7 +451,7 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
     return true;
   };
   if (const NSXMLExpandedName* name = test.onlyName()) {
-    walk(XQueryNamedVisit(name, add));
+    walk(XQueryNamedVisit(name, axis, add));
   } else if (test.onlyNames()) {
     walk(XQueryChoiceVisit(test, add));
   } else {

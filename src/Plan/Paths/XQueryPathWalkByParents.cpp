@@ -81,7 +81,8 @@ void XQueryPathWalk::visitCountedBelow(size_t index, NSXMLNode* node, Act act) {
     return act(found);
   };
   if (const NSXMLExpandedName* name = test.onlyName()) {
-    XQueryWalkAxis(node, XQueryAxisDescendant, XQueryNamedVisit(name, actOnCounted));
+    XQueryWalkAxis(node, XQueryAxisDescendant,
+                   XQueryNamedVisit(name, XQueryAxisDescendant, actOnCounted));
   } else if (test.onlyNames()) {
     XQueryWalkAxis(node, XQueryAxisDescendant, XQueryChoiceVisit(test, actOnCounted));
   } else {

@@ -4,6 +4,7 @@
 #include "Platform/Reading/XMLCharacters.h"
 #include "Platform/Text/UTF8.h"
 #include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeIndexes.h"
 
 #include <algorithm>
 #include <cstring>
@@ -42,6 +43,13 @@ ReadTree::ReadTree(uint32_t options, size_t expectedBytes)
       _builder(std::max(expectedBytes, size_t{256}), std::max(expectedBytes / 2, size_t{128})) {
   _builder.tree().becomeOld();
   _builder.openDocument();
+}
+
+// What is known of the tree is put down while the builder still owns it: there may be no memory.
+NSXMLDocument* ReadTree::finish() {
+  _builder.endOpenNodes();
+  NSXMLTreeIndexes::begin(_builder.current()->rootNode(), _singleNames.names());
+  return cast<NSXMLDocument>(_builder.finish());
 }
 
 // --- texts -----------------------------------------------------------------------------------
@@ -169,6 +177,7 @@ void ReadTree::addSection(std::string_view text) {
 
 void ReadTree::openElement(const NSXMLName* name) {
   flush();
+  _singleNames.add(name->expanded, *_builder.current());
   _builder.openElement(name);
 }
 

@@ -8,6 +8,7 @@
 #pragma once
 
 #include "Platform/Text/Blocks.h"
+#include "Platform/Tree/SingleNames.h"
 #include "Platform/Tree/TreeBuilder.h"
 
 #include <string_view>
@@ -30,7 +31,7 @@ class ReadTree {
 
   NSXMLTree& tree() { return _builder.tree(); }
   // The finished tree's root, which the caller must make a reference to.
-  [[nodiscard]] NSXMLDocument* finish() { return cast<NSXMLDocument>(_builder.finish()); }
+  [[nodiscard]] NSXMLDocument* finish();
 
   // Names must have been adopted by the tree. Of an element, its namespaces and then its attributes
   // follow.
@@ -92,6 +93,7 @@ class ReadTree {
   bool _keepsCDATA;
   bool _pendingIsExact = false;  // some of it came from a CDATA section: kept whatever it is
   NSXMLTreeBuilder _builder;
+  NSXMLSingleNamesMaker _singleNames;
   std::vector<SpaceChange, ValueAllocator<SpaceChange>> _spaceChanges;
   ValueText<char> _pending;  // text not yet stored
   std::vector<char16_t, ValueAllocator<char16_t>> _units;

@@ -1,7 +1,7 @@
 #include "Platform/Tree/TreeIndexes.h"
 
+#include "Platform/Base/LastingObjects.h"
 #include "Platform/Base/WorkMeter.h"
-#include "Platform/Tree/Arena.h"
 #include "Platform/Tree/TreeHead.h"
 
 #include <new>
@@ -75,6 +75,18 @@ NSXMLIndexesRef NSXMLTreeIndexes::of(const NSXMLNode* node) {
     }
   }
   return NSXMLIndexesRef(present);
+}
+
+void NSXMLTreeIndexes::begin(const NSXMLNode* root,
+                             std::unique_ptr<const NSXMLSingleNames> singleNames) {
+  if (!singleNames) return;
+  const LastingObjects lasting;
+  NSXMLTreeIndexes* const made = make(root);
+  if (!made) return;
+  made->_singleNames = std::move(singleNames);
+  NSXMLTree* const tree = NSXMLTree::of(root);
+  tree->dropIndexes();
+  tree->_indexes.store(made, std::memory_order_release);
 }
 
 bool NSXMLTreeIndexes::isOf(const NSXMLNode* node) const {

@@ -1,4 +1,5 @@
-// The indexes of a tree: names of elements, names of attributes, values by key.
+// The indexes of a tree: names of elements, names of attributes, values by key; and which names no
+// node has two children of, which is known of documents that were read.
 //
 // They belong to the tree, for whoever reads it, and go when it changes or is freed. What asks for
 // one may be one of several threads, each of which evaluates something of its own; what changes the
@@ -20,7 +21,9 @@
 // and small trees have none.
 #pragma once
 
+#include "Platform/Tree/Arena.h"
 #include "Platform/Tree/NameIndex.h"
+#include "Platform/Tree/SingleNames.h"
 #include "Platform/Tree/ValueIndex.h"
 
 #include <atomic>
@@ -66,6 +69,16 @@ class NSXMLTreeIndexes {
   [[nodiscard]] static NSXMLIndexesRef of(const NSXMLNode* node);
   // Whether they are those of the node's tree as it is now.
   bool isOf(const NSXMLNode* node) const;
+
+  // For who has built a tree that nobody else knows yet: what has been found out about it, kept
+  // until it changes. Not for small trees.
+  static void begin(const NSXMLNode* root, std::unique_ptr<const NSXMLSingleNames> singleNames);
+  // Whether it is known that no sibling of an element has the same name.
+  static bool isSingle(const NSXMLNode* element) {
+    const NSXMLTreeIndexes* const known =
+        NSXMLTree::of(element)->_indexes.load(std::memory_order_acquire);
+    return known && known->_singleNames && known->_singleNames->contains(element->expandedName());
+  }
 
   // Each answers the index if there is one, or if it is worth making now; null for: walk. `work` is
   // how many nodes that walk will meet.
@@ -119,6 +132,7 @@ class NSXMLTreeIndexes {
   const NSXMLNode* const _root;
   const uint32_t _lastNumber;
   std::mutex _making;
+  std::unique_ptr<const NSXMLSingleNames> _singleNames;  // known from the beginning, or null
   Place<NSXMLNameIndex> _elements;
   Place<NSXMLNameIndex> _attributes;
   std::atomic<KeyPlace*> _keys = nullptr;  // added in front, none taken out

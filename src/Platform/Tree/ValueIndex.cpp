@@ -3,6 +3,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
 #include "Platform/Tree/Names.h"
+#include "Platform/Tree/TreeIndexes.h"
 
 #include <algorithm>
 
@@ -47,8 +48,9 @@ class ValueWalk {
     if (step.isToDescendants) return walkDescendants(element, at);
     for (const NSXMLNode* child = element->firstChild(); child; child = child->nextSibling()) {
       _pacer.turn();
-      const bool isNamed = child->kind() == Kind::Element && child->expandedName() == name;
-      if (isNamed && !walk(child, at + 1)) return false;
+      if (child->kind() != Kind::Element || child->expandedName() != name) continue;
+      if (!walk(child, at + 1)) return false;
+      if (child->nextSibling() && NSXMLTreeIndexes::isSingle(child)) return true;
     }
     return true;
   }
