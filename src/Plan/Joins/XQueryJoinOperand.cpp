@@ -43,6 +43,12 @@ XQueryJoinOperand::XQueryJoinOperand(NSObject* item) {
   }
 }
 
+bool XQueryJoinOperand::hasText(const NSObject* item) {
+  if (!item || item->isNode()) return item != nullptr;
+  const XQueryTypeID type = XQueryObjectTypeID(item);
+  return type == XQueryTypeUntypedAtomic || type == XQueryTypeString;
+}
+
 bool XQueryJoinOperand::scan() {
   return kind == Untyped ? scanDouble(text.view(), number) : isNumber();
 }

@@ -15,6 +15,8 @@ struct XQueryJoinOperand {
   double number = 0;       // of a number; of an untyped one once it is scanned
 
   explicit XQueryJoinOperand(NSObject* item);
+  // Whether what is made of the item will be a text; null is none.
+  static bool hasText(const NSObject* item);
   bool isText() const { return kind == Untyped || kind == Text; }
   bool isDecimal() const { return kind == ExactDecimal || kind == InexactDecimal; }
   bool isNumber() const { return kind == Floating || isDecimal(); }

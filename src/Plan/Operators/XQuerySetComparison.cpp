@@ -1,6 +1,7 @@
 // Nobody can tell: pairs are compared in an order of which nothing is left to see, unless one of
 // them is an error. A set takes text, or else numbers, and a probe that it can answer: then no pair
-// is. Nothing is compared with a list without items, but each of the other items has to be one that
+// is: so a set of texts may also read its list as far as it takes to find one, and no further.
+// Nothing is compared with a list without items, but each of the other items has to be one that
 // can be compared, which those of a set are. Everything else is compared as it was written, and so
 // is everything with diagnostics on.
 #include "Plan/Operators/XQuerySetComparison.h"
@@ -9,6 +10,9 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Joins/XQueryGrowingTexts.h"
+#include "Plan/Joins/XQueryJoinOperand.h"
+#include "Plan/Joins/XQueryJoinTable.h"
 #include "xquery/Collection.h"
 #include "xquery/Number.h"
 
@@ -36,6 +40,60 @@ XQueryJoinRelation relationOf(int type, bool setIsLeft) {
 
 }  // namespace
 
+// Of texts that are asked for equal ones, those read so far; of anything else a table, once it is
+// made, or none where that cannot be.
+class XQuerySetComparison::Set final : public XQueryKeptValue {
+ public:
+  Set(const XQueryJoinRelation& by, const Value& items) : _by(by), _items(items) {
+    if (by.relation.test == XQueryRelation::Equal) _texts = XQueryGrowingTexts::of(items);
+  }
+
+  // Whether the table may be made: the same list has come a second time, or is long enough.
+  void allowTable() { _mayMakeTable = true; }
+  // Whether nothing can be an error that the items are compared with.
+  bool isRegular() { return _texts || (table() && _table->isRegular()); }
+  // Nothing for a probe that has to be compared the plain way.
+  std::optional<bool> meets(const Value& probe) {
+    if (const auto areMet = _texts ? meetsTexts(probe) : std::nullopt) return areMet;
+    return table() ? _table->meets(probe) : std::nullopt;
+  }
+
+ private:
+  std::optional<bool> meetsTexts(const Value& probe) {
+    const XQueryItemList list(probe.get());
+    WorkPacer pacer;
+    for (size_t i = 0; i < list.count(); ++i) {
+      pacer.turn();
+      if (!XQueryJoinOperand::hasText(list[i])) return std::nullopt;
+    }
+    for (size_t i = 0; i < list.count(); ++i) {
+      pacer.turn();
+      const auto isMet = _texts->contains(XQueryUntypedText(*list[i]).view());
+      if (isMet.value_or(true)) return isMet;
+    }
+    return false;
+  }
+  XQueryJoinTable* table() {
+    if (_table || !_mayMakeTable || _isRefused) return _table.get();
+    const auto listed = std::make_shared<std::vector<Value>>();
+    if (XQueryListItems(XQueryItemList(_items.get()), *listed) &&
+        listed->size() <= XQueryJoinTable::mostItems) {
+      _table = std::make_unique<XQueryJoinTable>(
+          _by, listed, [&listed](size_t index) { return (*listed)[index]; });
+      if (!_table->isComplete()) _table = nullptr;
+    }
+    _isRefused = !_table;
+    return _table.get();
+  }
+
+  const XQueryJoinRelation _by;
+  const Value _items;
+  std::unique_ptr<XQueryGrowingTexts> _texts;
+  std::unique_ptr<XQueryJoinTable> _table;
+  bool _mayMakeTable = false;
+  bool _isRefused = false;
+};
+
 Ref<XQuerySetComparison> XQuerySetComparison::exprWithPlain(Ref<XQueryOperatorExpr> plain,
                                                             Again again) {
   return make<XQuerySetComparison>(std::move(plain), again);
@@ -56,11 +114,16 @@ Value XQuerySetComparison::computeValue(XQueryContext& context) const {
   if (work <= fewPairs || _internal(context).showsErrors())
     return _comparison.answerFor(left, right, context);
   bool setIsLeft = leftCount > rightCount;
+  Gain gain = Gain::None;
   // However long a list is that is never seen again, looking its items up takes less than a set of
   // them, which could answer no other comparison.
   if (_again == Again::Left && leftCount >= fewItems) setIsLeft = true;
   if (_again == Again::Right && rightCount >= fewItems) setIsLeft = false;
-  const auto set = setOf(setIsLeft ? left : right, setIsLeft, work >= manyPairs, context);
+  const bool isAgain = _again == Again::Both || _again == (setIsLeft ? Again::Left : Again::Right);
+  const bool areEqual = _comparison.operatorType() == XQueryOperatorEqual;
+  if (areEqual && isAgain && (setIsLeft ? leftCount : rightCount) >= fewItems) gain = Gain::IfAgain;
+  if (work >= manyPairs) gain = Gain::AtOnce;
+  const auto set = setOf(setIsLeft ? left : right, setIsLeft, gain, context);
   if (pairs == 0 && left && right && set && set->isRegular()) return NSNull::null();
   const auto areMet = set ? set->meets(setIsLeft ? right : left) : std::nullopt;
   if (!areMet) return _comparison.answerFor(left, right, context);
@@ -68,28 +131,25 @@ Value XQuerySetComparison::computeValue(XQueryContext& context) const {
 }
 
 // Null where there is none, and for a list that may never be seen again.
-std::shared_ptr<XQueryJoinTable> XQuerySetComparison::setOf(const Value& items, bool isLeft,
-                                                            bool isWorthIt,
-                                                            XQueryContext& context) const {
+std::shared_ptr<XQuerySetComparison::Set> XQuerySetComparison::setOf(const Value& items,
+                                                                     bool isLeft, Gain gain,
+                                                                     XQueryContext& context) const {
   auto& keptValues = _internal(context).keptValues();
-  if (!isWorthIt && keptValues.looksAway(*this)) return nullptr;
+  if (gain != Gain::AtOnce && keptValues.looksAway(*this)) return nullptr;
   std::shared_ptr<XQueryKeptValue> kept;
   // Which side it is decides how it is asked.
   const std::array<Value, 2> dependencies = {items, NSNumber::numberWithBool(isLeft)};
-  const auto use = isWorthIt ? keptValues.useAtOnce(*this, dependencies, false, kept)
-                             : keptValues.use(*this, dependencies, false, kept);
+  const auto use = gain == Gain::None ? keptValues.use(*this, dependencies, false, kept)
+                                      : keptValues.useAtOnce(*this, dependencies, false, kept);
   if (use == XQueryKeptValues::Use::First) return nullptr;
-  if (use == XQueryKeptValues::Use::Further) return std::static_pointer_cast<XQueryJoinTable>(kept);
-  const auto listed = std::make_shared<std::vector<Value>>();
-  std::shared_ptr<XQueryJoinTable> made;
-  if (XQueryListItems(XQueryItemList(items.get()), *listed) &&
-      listed->size() <= XQueryJoinTable::mostItems) {
-    made = std::make_shared<XQueryJoinTable>(relationOf(_comparison.operatorType(), isLeft), listed,
-                                             [&listed](size_t index) { return (*listed)[index]; });
-    if (!made->isComplete()) made = nullptr;
+  auto set = std::static_pointer_cast<Set>(kept);
+  if (use == XQueryKeptValues::Use::Second) {
+    set = std::make_shared<Set>(relationOf(_comparison.operatorType(), isLeft), items);
+    keptValues.keep(*this, dependencies, set);
+    if (gain == Gain::IfAgain) return set;
   }
-  keptValues.keep(*this, dependencies, made);
-  return made;
+  if (set) set->allowTable();
+  return set;
 }
 
 }  // namespace xquery

@@ -1,7 +1,6 @@
 // A general comparison one side of which has many items: "@sku = //line/sku".
 #pragma once
 
-#include "Plan/Joins/XQueryJoinTable.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
 
 #include <cstdint>
@@ -20,7 +19,8 @@ class XQuerySetComparison : public XQueryPlannedExpr {
 
   // Of few pairs each is compared; of many, the items of one side are put into a set by their
   // values, which is kept for the next comparison with the same list: of the side that comes again,
-  // or else of the longer one.
+  // or else of the longer one. Where texts are asked for that are equal, only as many are as it
+  // takes to find one.
   Value computeValue(XQueryContext& context) const override;
 
  protected:
@@ -29,8 +29,11 @@ class XQuerySetComparison : public XQueryPlannedExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
-  std::shared_ptr<XQueryJoinTable> setOf(const Value& items, bool isLeft, bool isWorthIt,
-                                         XQueryContext& context) const;
+  class Set;
+  // How much is known to be gained by a set.
+  enum class Gain : uint8_t { None, IfAgain, AtOnce };
+  std::shared_ptr<Set> setOf(const Value& items, bool isLeft, Gain gain,
+                             XQueryContext& context) const;
 
   const XQueryOperatorExpr& _comparison;
   const Again _again;
