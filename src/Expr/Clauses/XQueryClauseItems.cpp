@@ -43,6 +43,17 @@ bool XQueryClauseItems::pick(const XQueryPicker* picker, XQueryContext& context,
   return picker->pick(_value, listItems, context, picks);
 }
 
+void XQueryClauseItems::fetchBehind(size_t index) const {
+  constexpr size_t ahead = 2;
+  constexpr size_t lineBytes = 64;
+  constexpr size_t lines = 8;
+  if (_isRange || ahead >= _count - index) return;
+  const auto item = reinterpret_cast<uintptr_t>(_list[index + ahead]);
+  for (size_t line = 0; line < lines; ++line) {
+    __builtin_prefetch(reinterpret_cast<const void*>(item + line * lineBytes));
+  }
+}
+
 Value XQueryClauseItems::operator[](size_t index) const {
   if (!_isRange) return _list[index];
   // Added as unsigned numbers: the last integer may be the greatest there is.

@@ -29,6 +29,9 @@ class XQueryClauseItems {
   // What the picker of the clause picks of them; false when each has to be asked.
   bool pick(const XQueryPicker* picker, XQueryContext& context, XQueryPicks& picks) const;
   Value operator[](size_t index) const;
+  // The items that follow soon begin to come into the cache, with what lies behind them: of an
+  // element, its attributes and first children. In a large document each would be waited for.
+  void fetchBehind(size_t index) const;
 
  private:
   Value _value;          // of anything but a range

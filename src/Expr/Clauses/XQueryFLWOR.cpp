@@ -179,6 +179,7 @@ bool XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
   }
   items.flatten();
   for (size_t k = 0; k < items.count(); ++k) {
+    items.fetchBehind(k);
     if (!evaluateItem(clause, index, items[k], k, toResults, withContext)) return false;
   }
   return true;

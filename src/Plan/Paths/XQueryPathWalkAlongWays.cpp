@@ -6,6 +6,7 @@
 // the order has to be free, and how often a node arrives must not show, as it does in what an
 // expression behind them answers for it.
 #include "Expr/Paths/XQueryPathResults.h"
+#include "Plan/Paths/XQueryIndexedWalk.h"
 #include "Plan/Paths/XQueryPathWalk.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/TreeIndexes.h"
@@ -152,16 +153,11 @@ void XQueryPathWalk::noteMet() const {
 // What so many steps find, of which the last one may have predicates to be asked.
 void XQueryPathWalk::takeIndexed(NSXMLNodeSpan nodes, size_t steps) {
   const XQueryWalkedStep& step = _steps[steps - 1];
-  WorkPacer pacer;
-  for (NSXMLNode* node : nodes) {
-    pacer.turn();
-    if (step.hasPredicates() && !keepsAlone(step, step.predicatesInTest, node)) {
-      if (hasFailed) return;
-      continue;
-    }
+  XQueryVisitSpan(nodes, [&](NSXMLNode* node) {
+    if (step.hasPredicates() && !keepsAlone(step, step.predicatesInTest, node)) return !hasFailed;
     takeNode(steps, node);
-    if (isOver()) return;
-  }
+    return !isOver();
+  });
 }
 
 }  // namespace xquery
