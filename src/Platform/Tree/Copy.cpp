@@ -5,6 +5,8 @@
 #include "Platform/Tree/TreeBuilder.h"
 #include "xquery/XMLNode.h"
 
+#include <array>
+
 namespace xquery {
 
 namespace {
@@ -49,13 +51,20 @@ class Copier {
   void visit(const NSXMLNode* node);
   const NSXMLName* nameOf(const NSXMLNode* original);
 
+  // Names come again and again, and the tree searches for each.
+  static constexpr size_t knownNames = 16;
+
   const NSXMLNode* _root;
   NSXMLTreeBuilder _builder;
+  std::array<const NSXMLName*, knownNames> _known{};  // each is the tree's already
 };
 
 const NSXMLName* Copier::nameOf(const NSXMLNode* original) {
   const NSXMLName* name = original->nodeName();
-  if (name) _builder.tree().use(name);
+  if (!name) return name;
+  const NSXMLName*& known = _known[name->hash % knownNames];
+  if (known != name) _builder.tree().use(name);
+  known = name;
   return name;
 }
 
