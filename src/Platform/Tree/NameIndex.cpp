@@ -49,6 +49,15 @@ class NSXMLNameIndex::Maker {
     return way;
   }
   uint32_t above(uint32_t way) const { return _ways[way].above; }
+  // The descendant axis goes on behind the subtrees of elements on this way and on those above it,
+  // so many in all.
+  void noteRunningOn(uint32_t way, size_t levels) {
+    WorkPacer pacer;
+    for (; levels > 0; --levels, way = above(way)) {
+      pacer.turn();
+      _ways[way].runsOn = true;
+    }
+  }
   void addInstruction() { _hasInstructions = true; }
   std::unique_ptr<const NSXMLNameIndex> index();
 
@@ -82,7 +91,7 @@ class NSXMLNameIndex::Maker {
     if (_table[place].way) return place;
     const auto way = static_cast<uint32_t>(_ways.size());
     _table[place] = {written, above, way};
-    _ways.push_back({written, node, above, 0, 0, _ways[above].below});
+    _ways.push_back({written, node, above, 0, 0, _ways[above].below, false});
     _ways[above].below = way;
     return place;
   }
@@ -191,10 +200,20 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofElements(const NSXMLNode
       node = child;
       continue;
     }
+    // Of the nodes that end here: the element at the bottom, or the one around what is none.
+    const bool isElement = node->kind() == Kind::Element;
+    const uint32_t lowest = isElement ? way : above;
+    size_t ending = 0;
     while (node && !node->nextSibling()) {
+      pacer.turn();
+      ++ending;
       node = node->parent();
       above = maker.above(above);
     }
+    // All but the topmost of them are last children of last children; behind the last ones of all
+    // there is nothing.
+    const size_t others = isElement ? 1 : 2;
+    if (node && ending > others) maker.noteRunningOn(lowest, ending - others);
     if (node) node = node->nextSibling();
   }
   return maker.index();
@@ -242,7 +261,9 @@ uint32_t NSXMLNameIndex::behind(uint32_t way, uint32_t top, bool isDeep) const {
   return _ways[way].next;
 }
 
-NSXMLNameIndex::Ways NSXMLNameIndex::waysAlong(std::span<const NSXMLWayStep> steps) const {
+std::optional<NSXMLNameIndex::Ways> NSXMLNameIndex::waysAlong(
+    std::span<const NSXMLWayStep> steps) const {
+  if (_ways.empty()) return std::nullopt;
   Ways ways(1);
   Ways further;
   WorkPacer pacer;
@@ -250,6 +271,7 @@ NSXMLNameIndex::Ways NSXMLNameIndex::waysAlong(std::span<const NSXMLWayStep> ste
     further.clear();
     for (const uint32_t way : ways) {
       pacer.turn();
+      if (step.isDeep && _ways[way].runsOn) return std::nullopt;
       addBelow(way, step, further);
     }
     // One below another is found from both.
@@ -269,21 +291,21 @@ uint64_t NSXMLNameIndex::countOn(const Ways& ways) const {
 }
 
 std::optional<uint64_t> NSXMLNameIndex::countAlong(std::span<const NSXMLWayStep> steps) const {
-  return _ways.empty() ? std::nullopt : std::optional(countOn(waysAlong(steps)));
+  const auto ways = waysAlong(steps);
+  return ways ? std::optional(countOn(*ways)) : std::nullopt;
 }
 
 std::optional<NSXMLNameIndex::Ways> NSXMLNameIndex::along(
     std::span<const NSXMLWayStep> steps) const {
-  if (_ways.empty()) return std::nullopt;
-  Ways ways = waysAlong(steps);
-  std::sort(ways.begin(), ways.end());
+  auto ways = waysAlong(steps);
+  if (ways) std::sort(ways->begin(), ways->end());
   return ways;
 }
 
 std::optional<NSXMLNodeSpan> NSXMLNameIndex::nodesAlong(std::span<const NSXMLWayStep> steps) const {
-  if (_ways.empty() || steps.empty() || !steps.back().name) return std::nullopt;
+  if (steps.empty() || !steps.back().name) return std::nullopt;
   const NSXMLNodeSpan all = nodes(steps.back().name);
-  return countOn(waysAlong(steps)) == all.size() ? std::optional(all) : std::nullopt;
+  return countAlong(steps) == all.size() ? std::optional(all) : std::nullopt;
 }
 
 // --- names ---------------------------------------------------------------------------------------

@@ -12,6 +12,8 @@
 // So how many elements the steps of a path from the document find is known without looking at any
 // of them, and where all elements of a name lie on the ways of a path these are what it finds. None
 // are kept where there are very many, or so many that they would take more memory than the nodes.
+// The descendant axis of the last child of a last child goes on behind its subtree
+// (Tree/Arena.h, descendantStop): what it finds is not told by the ways.
 //
 // An index is made in one pass and never changes. It is of the tree as it was: whoever uses it sees
 // to it that the tree has not changed (TreeIndexes.h). The pass looks at limits; one that is ended
@@ -74,7 +76,7 @@ class NSXMLNameIndex {
   uint64_t count(const NSXMLNameSelection& selection, const NSXMLNode* first,
                  const NSXMLNode* stop) const;
   // How many elements the steps find from the document at the root, each counted once; none where
-  // the ways are not known.
+  // the ways are not known, or do not tell.
   std::optional<uint64_t> countAlong(std::span<const NSXMLWayStep> steps) const;
   // On which ways these lie, by numbers in ascending order; and how many elements lie on some ways.
   using Ways = NSXMLIndexList<uint32_t>;
@@ -104,12 +106,13 @@ class NSXMLNameIndex {
     const NSXMLNode* first = nullptr;
     uint32_t above = 0;
     uint32_t count = 0;
-    uint32_t below = 0;  // the last one of those that are longer by a name; 0 for none
-    uint32_t next = 0;   // another one of the same length
+    uint32_t below = 0;   // the last one of those that are longer by a name; 0 for none
+    uint32_t next = 0;    // another one of the same length
+    bool runsOn = false;  // the descendant axis of some of them, behind their subtrees
   };
   void addBelow(uint32_t way, const NSXMLWayStep& step, Ways& found) const;
   uint32_t behind(uint32_t way, uint32_t top, bool isDeep) const;
-  Ways waysAlong(std::span<const NSXMLWayStep> steps) const;
+  std::optional<Ways> waysAlong(std::span<const NSXMLWayStep> steps) const;
 
   // The list of nodes and that of their ways, and the result.
   static constexpr size_t bytesPerNode = 2 * sizeof(NSXMLNodePlace) + sizeof(uint32_t);
