@@ -54,6 +54,8 @@ class ProgramGenerator {
   std::string pathInside();
   // Unions, intersections and differences of paths from the document.
   std::string setOfPaths(int depth);
+  // A loop whose condition looks at little more than the names above.
+  std::string askedOfNames(int depth);
   std::string path(int depth);
   std::string comparison(int depth);
   std::string operand(int depth);

@@ -106,6 +106,7 @@ std::string ProgramGenerator::nearbyNode() {
 std::string ProgramGenerator::existence(int depth) {
   std::string nodes = _random.below(3) ? "." + step(depth) : path(depth);
   if (depth > 0 && _random.below(4) == 0) nodes = "(" + setOfPaths(depth) + ")";
+  if (depth > 0 && _random.below(6) == 0) nodes = "(" + askedOfNames(depth) + ")";
   switch (_random.below(4)) {
     case 0:
       return nodes;
@@ -117,6 +118,22 @@ std::string ProgramGenerator::existence(int depth) {
     default:
       return _random.oneOf({"exists(", "empty(", "not(", "boolean("}) + nodes + ")";
   }
+}
+
+std::string ProgramGenerator::askedOfNames(int depth) {
+  const auto condition = [&] {
+    return _random.oneOf({"$k/ancestor::a", "not($k/parent::b)", "count($k/ancestor::*) > 2",
+                          "name($k) = 'a'", "local-name($k/..) eq 'b'", "$k/..",
+                          "(some $w in $k/ancestor::* satisfies $w/self::b)", "$l", "exists($l)",
+                          "count($l) < 2", "$l/parent::a", "$k/b", comparison(depth - 1)});
+  };
+  std::string text = "for $k in " + _random.oneOf({"//a", "//b", "//*", "/a/b", "//a//b", "/a//c",
+                                                   "//text()", "//a/b", path(depth - 1)});
+  text += " let $l := " + _random.oneOf({"$k/ancestor::b", "count($k/ancestor::a)", "$k/..",
+                                         "$k/ancestor::*[2]", "$k/c", variable()});
+  text += " where " + condition() + _random.oneOf({"", " and ", " or "});
+  if (text.ends_with(" ")) text += condition();
+  return text + " return " + _random.oneOf({"$k", "$k", "1", "$l", "$k/.."});
 }
 
 std::string ProgramGenerator::step(int depth) {
@@ -138,15 +155,36 @@ std::string ProgramGenerator::pathInside() {
   const std::string inner = _random.oneOf(
       {"//a", "//b/c", "/a/*", "//a | //b", "//a, //b", "(//a | //c), //b", "//a//b", "//*:a",
        "/a//c/..", "//@x", "//b[1]", "//a, $x", "(//a)/b", "((//a))", "//*/..", "//a, /a/b", "/"});
+  if (_random.below(6) == 0) return "(" + setOfPaths(1) + ")";
   const bool hasVariable = inner.ends_with("$x");
   return "(" + (hasVariable ? "//a, " + variable() : inner) + ")";
 }
 
 std::string ProgramGenerator::setOfPaths(int depth) {
   const auto set = [&] {
-    return _random.oneOf({"//a", "//b", "//a//b", "/a/b", "//b/c", "//*", "//*[self::a or self::c]",
-                          "//a[ancestor::b]", "//b[parent::a]", "//(a | b)", "//@x", "//c/..",
-                          "//a[@x]", "(//a | //b)/c", "/a//*", path(depth - 1)});
+    return _random.oneOf({"//a",
+                          "//b",
+                          "//a//b",
+                          "/a/b",
+                          "//b/c",
+                          "//*",
+                          "//*[self::a or self::c]",
+                          "//a[ancestor::b]",
+                          "//b[parent::a]",
+                          "//(a | b)",
+                          "//@x",
+                          "//c/..",
+                          "//a[@x]",
+                          "(//a | //b)/c",
+                          "/a//*",
+                          "//a[@x = '1']",
+                          "/a/*[b or @y]",
+                          "//@y",
+                          "/a//b[c]",
+                          "//a[x > 1]/b",
+                          "/a/b/c//a",
+                          variable(),
+                          path(depth - 1)});
   };
   static const std::vector<std::string> operators = {" | ", " intersect ", " except ", " union "};
   std::string text = set() + _random.oneOf(operators) + set();

@@ -18,10 +18,10 @@ namespace xquery::plantest {
 // Of the rules that have no tests of their own.
 inline size_t operatorsIn(std::string_view text) {
   static const std::set<std::string_view> others = {
-      "texts",      "short paths",     "constants",      "counts",     "sets",
-      "walks",      "operands",        "constructors",   "lists",      "nearby nodes",
-      "one by one", "ranges",          "paths in paths", "set counts", "loop counts",
-      "stretches",  "early conditions"};
+      "texts",      "short paths",      "constants",      "counts",     "sets",
+      "walks",      "operands",         "constructors",   "lists",      "nearby nodes",
+      "one by one", "ranges",           "paths in paths", "set counts", "loop counts",
+      "stretches",  "early conditions", "set filters",    "way counts"};
   return choicesIn(text, [](std::string_view rule) {
     return !others.contains(rule) && !rule.ends_with("-joins");
   });

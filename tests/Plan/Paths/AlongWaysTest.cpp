@@ -129,20 +129,28 @@ TEST(AlongWays, GoOnBehindLastChildrenOfLastChildren) {
 TEST(AlongWays, AsksOncePerWayWhatLooksUpByNames) {
   const Value trees[] = {records(120), records(90, true)};
   const std::vector<std::string> tests = {
-      "ancestor::people", "parent::person", "ancestor::item/ancestor::items", "self::name",
-      "count(ancestor::item) > 1", "ancestor::item[1]", "ancestor::item[2]", "not(parent::friend)",
-      "exists(ancestor-or-self::item[parent::items])", "empty(ancestor::friend)",
-      "0 = count(parent::person)", "parent::person or parent::friend", "ancestor::none",
-      "ancestor::person and not(ancestor::friend)", "parent::*", "..", "count(ancestor::*) > 3",
-      "count(ancestor::node()) = 4", "name() = 'name'", "local-name(..) eq 'person'",
-      "'friend' = name(parent::*)", "ancestor::*[name() = 'friend']",
-      "some $a in ancestor::* satisfies $a/parent::people",
-      "every $a in ancestor-or-self::* satisfies not($a/self::friend)",
-      "some $a in ancestor::item, $b in $a/ancestor::item satisfies $b/parent::items",
-      // These are asked of each.
-      "ancestor::person[note]", "ancestor::person/@n > 50", "count(ancestor::*)",
-      "name(..) = (., 'friend')", "some $a in ancestor::person satisfies $a/@n = '3'",
-      "parent::person[last()]", "ancestor::person = 'x'", "following-sibling::name"};
+      "ancestor::people",
+      "parent::person",
+      "ancestor::item/ancestor::items",
+      "self::name",
+      "count(ancestor::item) > 1",
+      "ancestor::item[1]",
+      "ancestor::item[2]",
+      "not(parent::friend)",
+      "exists(ancestor-or-self::item[parent::items])",
+      "empty(ancestor::friend)",
+      "0 = count(parent::person)",
+      "parent::person or parent::friend",
+      "ancestor::none",
+      "ancestor::person and not(ancestor::friend)",  // These are asked of each.
+      "ancestor::person[note]",
+      "ancestor::person/@n > 50",
+      "parent::*",
+      "..",
+      "count(ancestor::*)",
+      "parent::person[last()]",
+      "ancestor::person = 'x'",
+      "following-sibling::name"};
   for (const std::string& test : tests) {
     for (const char* path : {"//name", "//item", "/site//name", "//person/name", "//*", "//note"}) {
       const std::string filtered = std::string(path) + "[" + test + "]";
@@ -151,6 +159,26 @@ TEST(AlongWays, AsksOncePerWayWhatLooksUpByNames) {
         isSame("exists(" + filtered + "), count(" + filtered + "/..)", tree);
         isSame("count(" + filtered + ") > 100, " + filtered, tree);
       }
+    }
+  }
+}
+
+// Names, kinds and quantifiers in them.
+TEST(AlongWays, AsksOncePerWayWhateverLooksUp) {
+  const Value tree = records(60, true);
+  const std::vector<std::string> tests = {
+      "parent::*", "..", "count(ancestor::*) > 3", "count(ancestor::node()) = 4", "name() = 'name'",
+      "local-name(..) eq 'person'", "'friend' = name(parent::*)", "ancestor::*[name() = 'friend']",
+      "some $a in ancestor::* satisfies $a/parent::people",
+      "every $a in ancestor-or-self::* satisfies not($a/self::friend)",
+      "some $a in ancestor::item, $b in $a/ancestor::item satisfies $b/parent::items",
+      // These are asked of each.
+      "name(..) = (., 'friend')", "some $a in ancestor::person satisfies $a/@n = '3'"};
+  for (const std::string& test : tests) {
+    for (const char* path : {"//name", "//item", "//*"}) {
+      const std::string filtered = std::string(path) + "[" + test + "]";
+      isSame("count(" + filtered + ")", tree);
+      sameBothWays("exists(" + filtered + "), " + filtered, tree);
     }
   }
 }

@@ -1,0 +1,81 @@
+#include "Plan/Operators/XQueryPathFilter.h"
+
+#include "Context/StackGuard.h"
+#include "Context/XQueryContextInternal.h"
+#include "Expr/XQuerySequence.h"
+#include "Plan/Paths/XQueryPathPattern.h"
+#include "Platform/Base/WorkMeter.h"
+
+#include <algorithm>
+
+namespace xquery {
+namespace {
+
+const NSXMLDocument* documentOf(const XQueryContext& context) {
+  const auto* item = dyn_cast<NSXMLNode>(_internal(context).contextItem());
+  return item ? dyn_cast<NSXMLDocument>(item->rootNode()) : nullptr;
+}
+
+// Whether there is nothing to be had by asking it.
+bool isAnsweredAtOnce(const XQueryWalkedPath& path, const NSXMLDocument& document) {
+  return path.picker() ||
+         std::any_of(path.steps().begin(), path.steps().end(), [&](const XQueryWalkedStep& step) {
+           return step.lookup && step.lookup->isReady(&document);
+         });
+}
+
+}  // namespace
+
+Value XQueryPathFilter::computeValue(XQueryContext& context) const {
+  XQueryCheckStack(context);
+  const NSXMLDocument* document = documentOf(context);
+  // Diagnostics show every error that a predicate meets.
+  if (document && !_internal(context).showsErrors()) {
+    if (_paths.right && !isAnsweredAtOnce(*_paths.right, *document)) {
+      return filtered(*_operation->left(), *_paths.right, context);
+    }
+    if (_paths.left && !isAnsweredAtOnce(*_paths.left, *document)) {
+      return filtered(*_operation->right(), *_paths.left, context);
+    }
+  }
+  return plain().evaluateWithContext(context);
+}
+
+Value XQueryPathFilter::filtered(const XQueryExpr& operand, const XQueryWalkedPath& path,
+                                 XQueryContext& context) const {
+  const Value items = operand.evaluateWithContext(context);
+  if (XQueryHasFailed(items, context)) return {};
+  if (items && XQueryAllAreNodes(items) && documentOf(context)) {
+    return keptOf(items, path, context);
+  }
+  const Value others = path.evaluateWithContext(context);
+  if (XQueryHasFailed(others, context)) return {};
+  const bool isLeft = &operand == _operation->left();
+  return _operation->answerFor(isLeft ? items : others, isLeft ? others : items, context);
+}
+
+Value XQueryPathFilter::keptOf(const Value& items, const XQueryWalkedPath& path,
+                               XQueryContext& context) const {
+  auto& dynamic = _internal(context);
+  Value contextItem = dynamic.contextItem();
+  const int64_t position = dynamic.position();
+  const int64_t last = dynamic.last();
+  const bool wantsFound = _operation->operatorType() == XQueryOperatorIntersect;
+  const XQueryItemList list(items.get());
+  XQueryPathPattern pattern(path, *documentOf(context), context);
+  XQueryGatherer kept;
+  WorkPacer pacer;
+  for (size_t i = 0; i < list.count(); ++i) {
+    pacer.turn();
+    const bool isFound = pattern.finds(cast<NSXMLNode>(list[i]));
+    if (dynamic.isFailing()) return {};
+    if (isFound == wantsFound) kept.add(list[i]);
+  }
+  dynamic.setContextItem(std::move(contextItem), position);
+  dynamic.setLast(last);
+  // In document order, each once.
+  return XQueryOperatorExpr::sequenceOperatorEvaluate(XQueryOperatorUnion, kept.value(),
+                                                      NSNull::null(), context);
+}
+
+}  // namespace xquery
