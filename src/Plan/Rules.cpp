@@ -11,6 +11,8 @@ constexpr std::array rules = {
                XQueryTakeNames},
     XQueryRule{"paths in paths", "a path that begins with another one goes on from its steps",
                XQuerySplicePaths},
+    XQueryRule{"moved paths", "a path is walked where the variable is used that stands for it",
+               XQueryMovePaths},
     XQueryRule{"positions", "a position that is compared with a number is asked for by number",
                XQueryTakePositions},
     XQueryRule{"ranges", "the items from one position to another are taken without asking each",

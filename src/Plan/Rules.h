@@ -26,6 +26,7 @@ void XQueryWalkPaths(XQueryPlanning& planning);
 void XQueryKeepTrails(XQueryPlanning& planning);
 void XQueryFoldConstants(XQueryPlanning& planning);
 void XQueryTakeNames(XQueryPlanning& planning);
+void XQueryMovePaths(XQueryPlanning& planning);
 void XQuerySplicePaths(XQueryPlanning& planning);
 void XQueryTakePositions(XQueryPlanning& planning);
 void XQueryTakePositionRanges(XQueryPlanning& planning);

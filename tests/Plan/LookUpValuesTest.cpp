@@ -212,7 +212,7 @@ TEST(LookUpValues, LeavesOtherStepsAlone) {
                            "(/r/e)[1][@id = 'e7']",
                            "(/r/e, /r)[@id = 'e7']",
                            "(/r/e[2])[@id = 'e7']",
-                           "let $e := /r/e return $e[@id = 'e7']"}) {
+                           "let $e := /r/e return ($e[@id = 'e7'], $e)"}) {
     EXPECT_EQ(lookupsIn(text), 0U) << text;
     resultOf(text);
   }

@@ -56,6 +56,8 @@ class ProgramGenerator {
   std::string setOfPaths(int depth);
   // A loop whose condition looks at little more than the names above.
   std::string askedOfNames(int depth);
+  // A variable that is used instead of a path from the document.
+  std::string standsForPath(int depth);
   std::string path(int depth);
   std::string comparison(int depth);
   std::string operand(int depth);

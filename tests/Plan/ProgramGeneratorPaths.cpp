@@ -193,7 +193,18 @@ std::string ProgramGenerator::setOfPaths(int depth) {
   return text;
 }
 
+std::string ProgramGenerator::standsForPath(int depth) {
+  const std::string use = _random.oneOf(
+      {"$m" + step(depth), "$m[" + comparison(depth - 1) + "]" + step(depth), "count($m/b)",
+       "($m)/a", "($m/a, $m/b)", "$m[1]", "(let $n := $m/b return $n[@x = '1'])",
+       "(for $i in $m where $i/@x = " + literal() + " return $i/b)"});
+  return "(let $m := " +
+         _random.oneOf({"(/)", "//a", "/a/b", "//b/c", "/a/*", "//@x", "/a", "//a[1]"}) +
+         " return " + use + ")";
+}
+
 std::string ProgramGenerator::path(int depth) {
+  if (depth > 1 && _random.below(16) == 0) return standsForPath(depth - 1);
   std::string text = _random.oneOf({"", "", variable(), variable(), ".", pathInside()});
   if (text == "." && _random.below(2)) text = "(" + expr(depth - 1) + ")";
   const size_t steps = 1 + _random.below(3);

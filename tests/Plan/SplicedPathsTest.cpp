@@ -20,7 +20,7 @@ TEST(SplicedPaths, GoOnFromTheInnerSteps) {
   for (const char* path :
        {"(//a)/b", "((//a))//b", "(//a/c)/b/@y", "(/r/a)/b[1]", "(//c)/b[@y]/..", "(//a | //d)/a",
         "(//a, //c)/b", "((//c), (//a | //d))/*", "(//b)/parent::a/c", "(//*:a)/@x",
-        "(//b)/ancestor::a", "(//b, //b)/.."}) {
+        "(//b)/ancestor::a", "(//b, //b)/..", "(/)/r"}) {
     EXPECT_GE(choicesOf("paths in paths", path), 1U) << path;
     isSame(path);
     isSame(std::string("count(") + path + ")");
@@ -33,7 +33,7 @@ TEST(SplicedPaths, LeaveOthersAlone) {
   for (const char* path :
        {"(//a[1])/b", "(//a)[1]/b", "(//a)/position()", "(//a)/(b, @x)", "(a)/b", "(//a/name())/b",
         "(//a, 1)/b", "(//p:a)/b", "(//a)/<e/>", "(//a)", "unordered { (//a)/b }",
-        "for $d in //d return ($d/a)/..", "(/)/r", "(//a)/b/<e>{.}</e>/.."}) {
+        "for $d in //d return ($d/a)/..", "(//a)/b/<e>{.}</e>/.."}) {
     EXPECT_EQ(choicesOf("paths in paths", path), 0U) << path;
     isSame(path);
   }

@@ -13,6 +13,7 @@
 #include "Plan/Rules.h"
 #include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/PlaceInside.h"
+#include "Plan/Rules/SplicePath.h"
 
 #include <algorithm>
 
@@ -24,14 +25,16 @@ bool isPlain(const XQueryWalkedStep& step) {
 }
 
 bool canBeSpliced(const XQueryWalkedPath& path) {
-  if (!path.start() || !isa<XQueryRootStep>(path.start()) || path.steps().empty()) return false;
+  if (!path.start() || !isa<XQueryRootStep>(path.start())) return false;
   if (!path.start()->predicates().empty()) return false;
   return std::all_of(path.steps().begin(), path.steps().end(), [](const auto& step) {
     return isPlain(step) && step.step->predicates().empty();
   });
 }
 
-void splice(XQueryPlanning& planning, XQueryPlaceID place) {
+}  // namespace
+
+void XQuerySplicePath(XQueryPlanning& planning, XQueryPlaceID place) {
   const XQueryProgram& program = planning.program;
   XQueryWalkedPath* path = XQueryWalkedPathAt(planning, place);
   if (!path || !path->start() || path->steps().empty() || !program[place].isOrdered) return;
@@ -47,12 +50,10 @@ void splice(XQueryPlanning& planning, XQueryPlaceID place) {
   planning.choose(place);
 }
 
-}  // namespace
-
 void XQuerySplicePaths(XQueryPlanning& planning) {
   // Those inside first: "((P)/a)/b".
   for (const XQueryPlaceID place : planning.program.partsFirst()) {
-    if (planning.program[place].expr->kind() == Kind::PathExpr) splice(planning, place);
+    if (planning.program[place].expr->kind() == Kind::PathExpr) XQuerySplicePath(planning, place);
   }
 }
 
