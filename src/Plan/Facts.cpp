@@ -19,6 +19,7 @@ XQueryFacts XQueryFacts::items(XQueryItemKinds kinds, uint8_t least, uint8_t mos
 XQueryFacts XQueryFacts::nothingYet() {
   XQueryFacts facts = items(XQueryItems::None, many, 0);
   facts.inOrder = true;
+  facts.findsRoot = true;
   return facts;
 }
 

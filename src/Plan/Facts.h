@@ -92,6 +92,9 @@ struct XQueryFacts {
   uint8_t most = many;
   // They are nodes in document order, none of them twice, and of one tree.
   bool inOrder = false;
+  // There is a document above the context item of the focus in which the expression itself stands:
+  // it has looked for one there, and fails where there is none.
+  bool findsRoot = false;
   XQueryTreeFact tree = XQueryTreeFact::Any;
   XQueryItemKinds kinds = XQueryItems::Any;
   uint16_t deeds = 0;

@@ -30,7 +30,7 @@ constexpr std::array rows = {
     Row{Kind::CastableExpr, XQueryFactsOfTruth, true},
     Row{Kind::TreatExpr, XQueryFactsOfTreat, true},
     Row{Kind::CastExpr, XQueryFactsOfCast, true},
-    Row{Kind::RootStepExpr, XQueryFactsOfRoot, true},
+    Row{Kind::RootStepExpr, XQueryFactsOfRoot, false},
     Row{Kind::PathExpr, XQueryFactsOfPath, false},
     Row{Kind::ForExpr, XQueryFactsOfBinding, false},
     Row{Kind::LetExpr, XQueryFactsOfBinding, false},
@@ -39,8 +39,8 @@ constexpr std::array rows = {
     Row{Kind::OrderSpec, XQueryFactsOfOrderSpec, true},
     Row{Kind::OrderExpr, XQueryFactsOfList, false},
     Row{Kind::FLWORExpr, XQueryFactsOfFLWOR, false},
-    Row{Kind::QuantifiedExpr, XQueryFactsOfQuantifier, true},
-    Row{Kind::ConditionalExpr, XQueryFactsOfConditional, true},
+    Row{Kind::QuantifiedExpr, XQueryFactsOfQuantifier, false},
+    Row{Kind::ConditionalExpr, XQueryFactsOfConditional, false},
     Row{Kind::TypeswitchExpr, XQueryFactsOfTypeswitch, true},
     Row{Kind::ElementExpr, XQueryFactsOfConstructor, true},
     Row{Kind::AttributeExpr, XQueryFactsOfConstructor, true},
@@ -80,6 +80,7 @@ XQueryFacts deedsOfParts(const XQueryFactsAt& at) {
       facts.addDeedsWithin(at.table[part]);
     } else {
       facts.addDeeds(at.table[part]);
+      if (!traits.isOptional && at.table[part].findsRoot) facts.findsRoot = true;
     }
   });
   return facts;
@@ -144,6 +145,22 @@ const XQueryFacts& XQueryFactTable::ofFunction(const XQueryFunctionDecl* functio
   static const XQueryFacts unknown = anything();
   const auto found = _functions.find(function);
   return found == _functions.end() ? unknown : found->second;
+}
+
+bool XQueryFactTable::isSurelySet(XQueryPlaceID variable) const {
+  const XQueryPlaceID binder = _program[variable].binder;
+  if (binder == XQueryNoPlace) return false;
+  if (_program[binder].expr->kind() != Kind::QuantifiedItem) return true;
+  return variable < _program[_program[binder].parent].end && setsSurely(binder);
+}
+
+// It is not set when its clause had no items: the next one is tried in its place. The condition is
+// asked for an item of the last clause only.
+bool XQueryFactTable::setsSurely(XQueryPlaceID clause) const {
+  const XQueryFacts& items = _facts[clause];
+  if (items.least > 0 && !items.mayBe(XQueryItems::Other)) return true;
+  const XQueryPlaceID next = _program.nextPart(clause);
+  return next == XQueryNoPlace || _program[next].role != XQueryRole::Clause;
 }
 
 }  // namespace xquery

@@ -26,6 +26,10 @@ class XQueryFactTable {
   const XQueryFacts& operator[](XQueryPlaceID place) const { return _facts[place]; }
   // Of what a call of the function answers; the weakest for one that is not of the program.
   const XQueryFacts& ofFunction(const XQueryFunctionDecl* function) const;
+  // Whether the local variable that is read there has been set, whatever happened before.
+  bool isSurelySet(XQueryPlaceID variable) const;
+  // The same for that of a quantifier's clause wherever it can be read.
+  bool setsSurely(XQueryPlaceID clause) const;
 
  private:
   void analyse();
@@ -79,6 +83,10 @@ class XQueryFactsAt {
 // What a class of expressions concludes from its parts. The facts given already tell what all the
 // parts read and do together, and nothing of the items.
 using XQueryConclude = void (*)(const XQueryFactsAt& at, XQueryFacts& facts);
+
+// Whether there is a document above the context item, once evaluation comes to the place: what is
+// evaluated before has found it. Asked while the place is analysed.
+bool XQueryFindsRootBefore(const XQueryFactsAt& at);
 
 // Leaves.
 void XQueryFactsOfLiteral(const XQueryFactsAt& at, XQueryFacts& facts);

@@ -88,6 +88,7 @@ void XQueryFactsOfCall(const XQueryFactsAt& at, XQueryFacts& facts) {
   if (!call.functionDecl()) return;
   const XQueryFacts& summary = at.table.ofFunction(call.functionDecl());
   facts.addDeeds(summary);
+  facts.findsRoot = facts.findsRoot || summary.findsRoot;
   facts.setItems(summary);
 }
 

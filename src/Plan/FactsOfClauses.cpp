@@ -51,12 +51,26 @@ bool handsOnItsItems(const XQueryFactsAt& at, const XQueryFLWORExpr& expr) {
   return variable && variable->varID() == expr.forLet().front()->varID();
 }
 
+// The first clause that loops is evaluated whatever there is, and so are those that take a value
+// before it.
+bool findsRootAtOnce(const XQueryFactsAt& at) {
+  for (XQueryPlaceID part = at.program.firstPart(at.place);
+       part != XQueryNoPlace && at.program[part].role == XQueryRole::Clause;
+       part = at.program.nextPart(part)) {
+    if (at.table[part].findsRoot) return true;
+    if (at.program[part].expr->kind() != Kind::LetExpr) break;
+  }
+  return false;
+}
+
 }  // namespace
 
 // Of a clause they are those of what its variable takes; an item of it, for those that take one
 // after another.
 void XQueryFactsOfBinding(const XQueryFactsAt& at, XQueryFacts& facts) {
-  facts.setItems(at.partOrNone(XQueryRole::Bound));
+  const XQueryFacts bound = at.partOrNone(XQueryRole::Bound);
+  facts.setItems(bound);
+  facts.findsRoot = bound.findsRoot;
   const auto& clause = at.expr<XQueryBindingExpr>();
   if (!clause.type()) return;
   facts.deeds |= XQueryDeeds::MayFail;
@@ -88,19 +102,23 @@ void XQueryFactsOfFLWOR(const XQueryFactsAt& at, XQueryFacts& facts) {
     items.inOrder = at.table[at.program.part(at.place, XQueryRole::Clause)].inOrder;
   }
   facts.setItems(items);
+  facts.findsRoot = findsRootAtOnce(at);
   for (const auto& clause : expr.forLet()) declare(*clause, true, facts);
 }
 
 void XQueryFactsOfQuantifier(const XQueryFactsAt& at, XQueryFacts& facts) {
-  const auto& expr = at.expr<XQueryQuantifiedExpr>();
   XQueryItemKinds kinds = XQueryItems::Boolean;
   // A binding of a wrong type makes an error record the answer.
-  for (const auto& clause : expr.items()) {
+  at.forEachPart([&](XQueryPlaceID part) {
+    const auto* clause = dyn_cast<XQueryQuantifiedExprItem>(at.program[part].expr);
+    if (!clause) return;
     if (clause->type()) kinds |= XQueryItems::Other;
-    declare(*clause, expr.items().size() == 1, facts);
-  }
+    declare(*clause, at.table.setsSurely(part), facts);
+  });
   kinds |= at.partOrNone(XQueryRole::Satisfies).kinds & XQueryItems::Other;
+  if ((kinds & XQueryItems::Other) != 0) facts.deeds |= XQueryDeeds::MayFail;
   facts.setItems(kinds, 1, 1);
+  facts.findsRoot = findsRootAtOnce(at);
 }
 
 void XQueryFactsOfConditional(const XQueryFactsAt& at, XQueryFacts& facts) {
@@ -113,6 +131,9 @@ void XQueryFactsOfConditional(const XQueryFactsAt& at, XQueryFacts& facts) {
   });
   if (branches < 2) items.orItems(XQueryFacts::none());
   facts.setItems(items);
+  // An error record is no truth, and what was never set no answer.
+  const bool mayHoldErrors = at.partOrNone(XQueryRole::Test).mayBe(XQueryItems::Other);
+  if (mayHoldErrors || items.mayBe(XQueryItems::Other)) facts.deeds |= XQueryDeeds::MayFail;
 }
 
 void XQueryFactsOfTypeswitch(const XQueryFactsAt& at, XQueryFacts& facts) {

@@ -67,7 +67,7 @@ void XQueryFactsOfVariable(const XQueryFactsAt& at, XQueryFacts& facts) {
   }
   facts.reads.add(varID);
   const XQueryPlaceID binder = at.here().binder;
-  if (!at.program.isSurelySet(at.place)) {
+  if (!at.table.isSurelySet(at.place)) {
     facts.deeds |= XQueryDeeds::MayFail;
     return;
   }

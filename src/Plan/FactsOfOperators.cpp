@@ -3,6 +3,7 @@
 #include "Expr/TypeTests/XQueryTypeDeclaration.h"
 #include "Expr/TypeTests/XQueryTypeExprs.h"
 #include "Plan/FactsAnalysis.h"
+#include "Plan/Rules/PositionConditions.h"
 
 namespace xquery {
 namespace {
@@ -63,6 +64,17 @@ bool canBeCompared(const XQueryFacts& left, const XQueryFacts& right, bool isGen
   return !isGeneral || !(castsText(left, right) || castsText(right, left));
 }
 
+// A range between two literals that is not too long for any machine has so many integers.
+bool isShortRange(const XQueryOperatorExpr& range, XQueryFacts& facts) {
+  constexpr int64_t mostIntegers = int64_t{1} << 16;
+  const auto first = XQuerySmallIntegerIn(range.left());
+  const auto last = XQuerySmallIntegerIn(range.right());
+  if (!first || !last || *last - *first >= mostIntegers) return false;
+  const int64_t count = std::clamp<int64_t>(*last - *first + 1, 0, XQueryFacts::many);
+  facts.setItems(Integer, static_cast<uint8_t>(count), static_cast<uint8_t>(count));
+  return true;
+}
+
 }  // namespace
 
 bool XQueryOperatorMayFail(int type, const XQueryFacts& left, const XQueryFacts& right) {
@@ -82,6 +94,7 @@ void XQueryFactsOfOperator(const XQueryFactsAt& at, XQueryFacts& facts) {
   const auto& expr = at.expr<XQueryOperatorExpr>();
   const Operands operands = operandsOf(at);
   const int operatorClass = XQueryOperatorExpr::operatorClassification(expr.operatorType());
+  if (expr.operatorType() == XQueryOperatorTo && isShortRange(expr, facts)) return;
   if (XQueryOperatorMayFail(expr.operatorType(), operands.left, operands.right)) {
     facts.deeds |= XQueryDeeds::MayFail;
   }

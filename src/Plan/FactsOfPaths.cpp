@@ -166,8 +166,10 @@ XQueryItemKinds XQueryKindsOfStep(const XQueryAxisStep& step) {
   return kindsOnAxis(step.axis()) & kindsOfTest(step.expr());
 }
 
-void XQueryFactsOfRoot(const XQueryFactsAt&, XQueryFacts& facts) {
+void XQueryFactsOfRoot(const XQueryFactsAt& at, XQueryFacts& facts) {
   facts.deeds |= XQueryDeeds::ReadsRoot;
+  if (!XQueryFindsRootBefore(at)) facts.deeds |= XQueryDeeds::MayFail;
+  facts.findsRoot = true;
   facts.setItems(Document, 1, 1);
   facts.tree = XQueryTreeFact::OfContext;
 }

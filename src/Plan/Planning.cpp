@@ -34,7 +34,7 @@ XQueryPlanning::XQueryPlanning(XQueryProgram& ofProgram)
     const XQueryPlaceID end = body.place < program.placeCount() ? program[body.place].end : 0;
     for (XQueryPlaceID place = body.place; place < end; ++place) {
       const auto* variable = dyn_cast<XQueryVariable>(program[place].expr);
-      if (!variable || program.isSurelySet(place)) continue;
+      if (!variable || facts.isSurelySet(place)) continue;
       XQueryVariableSet read;
       read.add(variable->varID());
       const bool isParameter = program[place].binder == XQueryNoPlace && parameters.holds(read);
