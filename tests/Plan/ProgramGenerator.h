@@ -8,6 +8,7 @@
 
 #include "Expr/RandomChoices.h"
 
+#include <functional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -105,6 +106,8 @@ class ProgramGenerator {
   std::string positions();
   // What has a certain value, asked so often that an index of values is worth its making.
   std::string lookedUp(int depth);
+  // The same in a list that a variable holds. `condition` writes one on an item.
+  std::string lookedUpInList(const std::function<std::string(const std::string&)>& condition);
   std::string negatedFor(const std::string& kind, const std::string& condition);
   // The same condition for one item after another, so that a table is worth its making.
   std::string join(int depth);

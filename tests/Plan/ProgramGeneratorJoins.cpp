@@ -273,6 +273,7 @@ std::string ProgramGenerator::lookedUp(int depth) {
          "boolean(" + from + "[" + probe + " eq .])", "string(" + from + ")" + equals,
          "data(" + from + ")" + equals, from + equals + " and " + comparison(depth - 1)});
   };
+  if (_random.below(3) == 0) return lookedUpInList(condition);
   const std::string path = _random.oneOf({"//b", "//*", "/a/b", "//@x", "(//a | //b)", "/*/*",
                                           "//(b | c)", "(//b)", "/descendant::b", "$g//b"});
   const std::string all = _hasGlobal || !path.starts_with("$") ? path : "//b";
@@ -289,6 +290,43 @@ std::string ProgramGenerator::lookedUp(int depth) {
            return "(for $u in " + all + " " + clause + "where " + where + " return $u" +
                   _random.oneOf({"", "/..", "/@x"}) + "))";
          });
+}
+
+std::string ProgramGenerator::lookedUpInList(
+    const std::function<std::string(const std::string&)>& condition) {
+  const std::string list =
+      _random.oneOf({"//b", "/a/b", "//b", "/a/*", "//*[c]", "//b[@x]", "//b/@x", "(//c, //b)",
+                     "(//b)[position() < 60]", "(//b, <b x='1'/>)", "reverse(//b)", "//@*"});
+  const std::string probes = _random.oneOf({"('1', '2', '1')", "(//b)[position() < 5]/@x",
+                                            "('u', 1, '')", "(//b, 'v')[position() < 9]"});
+  const std::string start = "(let $l := " + list + " for $o in " + probes + " return ";
+  return start +
+         within(
+             "$l",
+             [&] {
+               return within("$o", [&]() -> std::string {
+                 const std::string each = _random.oneOf({"$u in $l", "$u in $l", "$u in " + list});
+                 switch (_random.below(7)) {
+                   case 0:
+                     return "$l[" + condition(".") + "]";
+                   case 1:
+                     return "count($l[" + condition(".") + "])";
+                   case 2:
+                     return "(" + _random.oneOf({"$l = $o", "$o = $l", "not($l = ($o, '2'))"}) +
+                            ")";
+                   case 3:
+                     return "(some " + each + " satisfies " + condition("$u") + ")";
+                   case 4:
+                     return "(every " + each + " satisfies not(" + condition("$u") + "))";
+                   case 5:
+                     return "exists(for " + each + " where " + condition("$u") + " return $u)";
+                   default:
+                     return "(for " + each + " where " + condition("$u") + " return " +
+                            _random.oneOf({"$u", "$u/@x", "<b>{$u}</b>"}) + ")";
+                 }
+               });
+             }) +
+         ")";
 }
 
 std::string ProgramGenerator::negatedFor(const std::string& kind, const std::string& condition) {

@@ -204,6 +204,7 @@ XQueryJoinScope XQueryClauseJoins::scopeOf(size_t index) const {
   scope.item.add(clause.varID());
   scope.settled.add(clause.varID());
   scope.settled.add(positionOf(clause));
+  scope.itemID = clause.varID();
   return scope;
 }
 

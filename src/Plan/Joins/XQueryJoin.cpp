@@ -3,6 +3,7 @@
 #include "Context/KeptValues.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/XQuerySequence.h"
+#include "Plan/Joins/XQueryIndexedItems.h"
 #include "Plan/Joins/XQueryJoinPair.h"
 #include "Plan/Operators/XQueryTentative.h"
 #include "Platform/Base/WorkMeter.h"
@@ -113,6 +114,7 @@ class XQueryJoin::Tables final : public XQueryKeptValue {
   }
 
   const XQueryJoinTable::Items items;
+  std::shared_ptr<const XQueryIndexedItems> indexed;     // in place of the only table, or null
   std::vector<std::unique_ptr<XQueryJoinTable>> byTerm;  // null for one that is not there
   size_t next = 0;                                       // the one that is made next
   size_t picked = 0;                                     // items, since the last one was made
@@ -152,6 +154,7 @@ bool XQueryJoin::pick(const Value& source, const Lister& listItems, XQueryContex
   const Truth guards = truthOf(_condition.guards, context);
   if (guards == Truth::Failure) return false;
   if (guards == Truth::No && _condition.terms.front().relation.isComplement) return false;
+  if (found->indexed && pickIndexed(*found, guards == Truth::Yes, context, picks)) return true;
   std::vector<Asked> asked;
   if (!askEach(*found, guards == Truth::Yes, context, asked)) return false;
   const bool areAll = asked.size() == _condition.terms.size();
@@ -173,8 +176,11 @@ std::shared_ptr<XQueryJoin::Tables> XQueryJoin::tables(const Value& source, cons
   if (keptValues.looksAway(_owner)) return nullptr;
   std::shared_ptr<XQueryKeptValue> kept;
   switch (keptValues.use(_owner, {&source, 1}, _looksAroundSource, kept)) {
-    case XQueryKeptValues::Use::First:
-      return nullptr;
+    case XQueryKeptValues::Use::First: {
+      auto made = indexed(source, listItems, context);
+      if (made) keptValues.keep(_owner, {&source, 1}, made);
+      return made;
+    }
     case XQueryKeptValues::Use::Second: {
       auto made = makeTables(listItems, context);
       keptValues.keep(_owner, {&source, 1}, made);
@@ -186,8 +192,79 @@ std::shared_ptr<XQueryJoin::Tables> XQueryJoin::tables(const Value& source, cons
   return std::static_pointer_cast<Tables>(kept);
 }
 
+// The way by which the index of a tree may answer in place of a table; null for none. What has to
+// be asked of items that are left out needs a table.
+const XQueryValueWay* XQueryJoin::indexedWay() const {
+  const XQueryJoinTerm& term = _condition.terms.front();
+  const bool isAlone =
+      _condition.terms.size() == 1 && _condition.checks.empty() && !_condition.filtersMayFail;
+  return isAlone && term.way && !term.mustNotFail && !term.mustAnswer ? &*term.way : nullptr;
+}
+
+// What the index of the tree answers costs no table, so that it need not be known whether the items
+// come again. Null where it does not.
+std::shared_ptr<XQueryJoin::Tables> XQueryJoin::indexed(const Value& source,
+                                                        const Lister& listItems,
+                                                        XQueryContext& context) const {
+  const XQueryValueWay* way = indexedWay();
+  const XQueryItemList list(source.get());
+  if (!way || list.count() < XQueryIndexedItems::fewestItems) return nullptr;
+  if (!XQueryIndexedItems::mayAnswer(list[0], *way, context)) return nullptr;
+  if (!XQueryAreSettled({&source, 1}, _looksAroundSource)) return nullptr;
+  auto made = tablesOf(listItems);
+  if (made) made->indexed = XQueryIndexedItems::of(made->items, *way, context);
+  return made && made->indexed ? made : nullptr;
+}
+
+// Picks by the index; false where a table, or the plain way, has to answer.
+bool XQueryJoin::pickIndexed(Tables& tables, bool withProbes, XQueryContext& context,
+                             XQueryPicks& picks) const {
+  const auto indexed = tables.indexed;
+  const XQueryJoinTerm& term = _condition.terms.front();
+  if (term.outward && !isInvariantInRound(*term.outward, context)) return false;
+  const bool areSure = _condition.isWhole && _condition.filters.empty();
+  std::vector<uint32_t> positions;
+  if (withProbes) {
+    const Value probe = XQueryValueOrNull(*term.probe, context);
+    const XQueryItemList probes(probe.get());
+    const bool isError = term.relation.isValueComparison && probes.count() > 1;
+    const bool isFound =
+        probe && !isError &&
+        indexed->find(probes, picks.wantsFirst && areSure, positions, tables.picked);
+    if (!isFound) return prepareTable(tables, context);
+  }
+  if (indexed->isWorthATable(tables.picked)) prepareTable(tables, context);
+  picks.items = tables.items;
+  if (areSure && picks.wantedNumber != XQueryPicks::Number::Unwanted) {
+    picks.number = positions.size();
+    return true;
+  }
+  picks.chosen.reserve(positions.size());
+  for (const uint32_t position : positions) picks.chosen.push_back({position, areSure});
+  return true;
+}
+
+// From now on a table answers in place of the index, if it can be made. Always false.
+bool XQueryJoin::prepareTable(Tables& tables, XQueryContext& context) const {
+  tables.indexed = nullptr;
+  if (!tables.byTerm.front()) addTable(tables, context);
+  return false;
+}
+
 std::shared_ptr<XQueryJoin::Tables> XQueryJoin::makeTables(const Lister& listItems,
                                                            XQueryContext& context) const {
+  auto made = tablesOf(listItems);
+  if (!made) return nullptr;
+  if (const XQueryValueWay* way = indexedWay()) {
+    made->indexed = XQueryIndexedItems::of(made->items, *way, context);
+    if (made->indexed) return made;
+    XQueryIndexedItems::noteAsked(*made->items, *way);
+  }
+  return addTable(*made, context) ? made : nullptr;
+}
+
+// Without any table yet; null for items that have none.
+std::shared_ptr<XQueryJoin::Tables> XQueryJoin::tablesOf(const Lister& listItems) const {
   auto items = std::make_shared<std::vector<Value>>();
   if (!listItems(*items)) return nullptr;
   if (items->size() < XQueryJoinTable::fewestItems || items->size() > XQueryJoinTable::mostItems) {
@@ -198,8 +275,7 @@ std::shared_ptr<XQueryJoin::Tables> XQueryJoin::makeTables(const Lister& listIte
                                       [](const Value& item) { return isa<XQueryError>(item); });
   if (holdErrors) return nullptr;
   if (_condition.looksOutOfItems && !XQueryAreSettled(*items, true)) return nullptr;
-  auto made = std::make_shared<Tables>(std::move(items), _condition.terms.size());
-  return addTable(*made, context) ? made : nullptr;
+  return std::make_shared<Tables>(std::move(items), _condition.terms.size());
 }
 
 // Makes the next table that can be made, if any.

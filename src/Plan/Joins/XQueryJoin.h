@@ -50,7 +50,14 @@ class XQueryJoin final : public XQueryPicker {
 
   std::shared_ptr<Tables> tables(const Value& source, const Lister& listItems,
                                  XQueryContext& context) const;
+  std::shared_ptr<Tables> tablesOf(const Lister& listItems) const;
   std::shared_ptr<Tables> makeTables(const Lister& listItems, XQueryContext& context) const;
+  const XQueryValueWay* indexedWay() const;
+  std::shared_ptr<Tables> indexed(const Value& source, const Lister& listItems,
+                                  XQueryContext& context) const;
+  bool prepareTable(Tables& tables, XQueryContext& context) const;
+  bool pickIndexed(Tables& tables, bool withProbes, XQueryContext& context,
+                   XQueryPicks& picks) const;
   bool addTable(Tables& tables, XQueryContext& context) const;
   Value keyOf(const Value& item, size_t position, size_t term, XQueryContext& context) const;
   bool askEach(const Tables& tables, bool withProbes, XQueryContext& context,

@@ -13,6 +13,7 @@
 #include "Plan/Joins/XQueryJoinedSteps.h"
 #include "Plan/Joins/XQueryPartOfCall.h"
 #include "Plan/Rules/PathAt.h"
+#include "Plan/Rules/ValueConditions.h"
 #include "Prolog/XQueryDeclarations.h"
 
 #include <algorithm>
@@ -86,6 +87,7 @@ struct XQueryJoinSearch::Comparison {
   Ref<XQueryExpr> probe;
   XQueryFacts keyFacts;
   XQueryFacts probeFacts;
+  XQueryPlaceID keyPlace = XQueryNoPlace;  // where the key is written, if it is
   bool isWhole = true;
 };
 
@@ -131,6 +133,7 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOf(int operatorType, Op
   found.probe = std::move(right.expr);
   found.keyFacts = left.facts;
   found.probeFacts = right.facts;
+  found.keyPlace = left.place;
   return found;
 }
 
@@ -142,8 +145,8 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::operandsAt(XQueryPlaceID place,
   const XQueryPlaceID right = _planning.program.nextPart(left);
   // A comparison with a range looks at its bounds; listing its integers may take all memory.
   if (XQueryOperatorExpr::rangeIn(at(right).expr)) return {};
-  return comparisonOf(comparison->operatorType(), {_planning.exprAt(left), facts(left)},
-                      {_planning.exprAt(right), facts(right)}, scope);
+  return comparisonOf(comparison->operatorType(), {_planning.exprAt(left), facts(left), left},
+                      {_planning.exprAt(right), facts(right), right}, scope);
 }
 
 // A call of a function whose body is a comparison.
@@ -227,6 +230,7 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfSome(XQueryPlaceID pl
   // What reads the focus reads the item, and is no probe.
   if (_scope.isFocus && found.probeFacts.does(XQueryDeeds::ReadsFocus)) return {};
   found.isWhole = all.size() == 1;
+  found.keyPlace = XQueryNoPlace;
   // For each value of the variable there is a key, or else a probe.
   const bool ofKey = reads == XQueryJoinReads::Item;
   XQueryFacts& own = ofKey ? found.keyFacts : found.probeFacts;
@@ -238,6 +242,7 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfSome(XQueryPlaceID pl
   const auto* itself = dyn_cast<XQueryVariable>(XQueryWithoutParentheses(expr.get()));
   if (itself && itself->varID() == clause.varID()) {
     expr = _planning.exprAt(bound);
+    if (ofKey) found.keyPlace = bound;
   } else {
     expr = XQueryJoinKeys::exprWithClauses(
         {{clause.varID(), _planning.exprAt(bound), true, facts(clausePlace)}}, expr,
@@ -275,6 +280,7 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfPath(XQueryPlaceID pl
   pathFacts.addDeeds(XQueryFactsUpTo(_planning, place, *path, last));
   pathFacts.addDeedsWithin(found.keyFacts);
   found.isWhole = all.size() == 1;
+  found.keyPlace = XQueryNoPlace;
   found.key = XQueryInnerKeys::exprWithPath(Ref<XQueryWalkedPath>(path), *last.step, found.key);
   found.keyFacts = pathFacts;
   const XQueryJoinReads reads = _scope.readsOf(pathFacts);
@@ -359,6 +365,7 @@ struct XQueryJoinSearch::Before {
   // The condition has a term behind all this.
   void addTo(XQueryJoinCondition& condition) const {
     condition.filters = others.filters;
+    condition.filtersMayFail = others.filtersMayFail;
     condition.guards = others.guards;
     condition.checks = others.checks;
     condition.needed = others.needed;
@@ -414,6 +421,7 @@ bool XQueryJoinSearch::pass(XQueryPlaceID place, Before& before) const {
   switch (itemOnly.readsOf(parts)) {
     case XQueryJoinReads::Item:
       others.filters.push_back(_planning.exprAt(place));
+      others.filtersMayFail = others.filtersMayFail || !cannotFail(place);
       others.looksOutOfItems = others.looksOutOfItems || looksOut;
       return true;
     case XQueryJoinReads::Round:
@@ -462,7 +470,21 @@ XQueryJoinTerm XQueryJoinSearch::made(const Comparison& comparison) const {
   term.looksOutOfItems =
       term.looksOutOfItems || comparison.keyFacts.does(XQueryDeeds::ReadsOutside);
   if (comparison.probeFacts.does(XQueryDeeds::ReadsOutside)) term.outward = comparison.probeFacts;
+  if (clauses.empty()) term.way = wayOf(comparison);
   return term;
+}
+
+// Of "@id", "$s/buyer/@person" and the like. A value comparison with several keys is an error.
+std::optional<XQueryValueWay> XQueryJoinSearch::wayOf(const Comparison& comparison) const {
+  const XQueryJoinRelation& by = comparison.relation;
+  const bool isEquality = by.relation.test == XQueryRelation::Equal && !by.relation.negated &&
+                          !by.isPrefix && !by.isIdentity && !by.isComplement;
+  const bool isOfOne = by.isValueComparison && comparison.keyFacts.most > 1;
+  const bool hasItem = _scope.isFocus || _scope.itemID != 0;
+  if (!isEquality || isOfOne || !hasItem || comparison.keyPlace == XQueryNoPlace) {
+    return std::nullopt;
+  }
+  return XQueryWayFrom(_planning, comparison.keyPlace, _scope.isFocus ? 0 : _scope.itemID);
 }
 
 XQueryJoinCondition XQueryJoinSearch::conditionIn(XQueryPlaceID place, bool errorExcludes) const {

@@ -5,6 +5,7 @@
 #include "Expr/XQueryExpr.h"
 #include "Plan/Joins/XQueryJoinKeys.h"
 #include "Plan/Joins/XQueryJoinTable.h"
+#include "Plan/Paths/XQueryValueWay.h"
 #include "Plan/Planning.h"
 
 #include <optional>
@@ -25,6 +26,7 @@ struct XQueryJoinScope {
   bool isFocus = false;       // the item is the context item; otherwise
   XQueryVariableSet item;     // variables that hold the item, or what follows from it alone
   XQueryVariableSet settled;  // variables that are set anew for each item, these included
+  int64_t itemID = 0;         // the variable that holds the item itself, if any
 
   XQueryJoinReads readsOf(const XQueryFacts& facts) const;
 };
@@ -44,6 +46,9 @@ struct XQueryJoinTerm {
   bool looksOutOfItems = false;
   // What the probe reads where it looks outside the nodes that it starts from.
   std::optional<XQueryFacts> outward;
+  // Of an equality the way from an item to its key, if it is one by which the index of a tree may
+  // know the item.
+  std::optional<XQueryValueWay> way;
 };
 
 struct XQueryJoinCondition {
@@ -55,6 +60,7 @@ struct XQueryJoinCondition {
   // What else there is up to the last term, all joined by "and": conditions that read the item
   // only, and those that do not read it.
   std::vector<Ref<XQueryExpr>> filters;
+  bool filtersMayFail = false;
   std::vector<Ref<XQueryExpr>> guards;
   // What would be evaluated for an item that is left out, and must not fail: what reads the item
   // only, and what does not read it.
@@ -102,6 +108,7 @@ class XQueryJoinSearch {
   struct Operand {
     Ref<XQueryExpr> expr;
     XQueryFacts facts;
+    XQueryPlaceID place = XQueryNoPlace;  // unless it is that of a function's body
   };
   static Comparison comparisonOf(int operatorType, Operand left, Operand right,
                                  const XQueryJoinScope& scope);
@@ -120,6 +127,7 @@ class XQueryJoinSearch {
                 Before& before) const;
   bool passComparison(XQueryPlaceID place, const XQueryJoinScope& scope, Before& before) const;
   std::vector<XQueryJoinClause> clausesBefore(const XQueryFacts& key) const;
+  std::optional<XQueryValueWay> wayOf(const Comparison& comparison) const;
   XQueryJoinTerm made(const Comparison& comparison) const;
 
   const XQueryPlanning& _planning;

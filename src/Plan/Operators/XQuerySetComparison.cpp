@@ -11,6 +11,7 @@
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Joins/XQueryGrowingTexts.h"
+#include "Plan/Joins/XQueryIndexedItems.h"
 #include "Plan/Joins/XQueryJoinOperand.h"
 #include "Plan/Joins/XQueryJoinTable.h"
 #include "xquery/Collection.h"
@@ -40,25 +41,65 @@ XQueryJoinRelation relationOf(int type, bool setIsLeft) {
 
 }  // namespace
 
-// Of texts that are asked for equal ones, those read so far; of anything else a table, once it is
-// made, or none where that cannot be.
+// Of one side: what the index of the items' tree knows of them, or else, of texts that are asked
+// for equal ones, those read so far; of anything else a table, once it is made, or none where that
+// cannot be.
 class XQuerySetComparison::Set final : public XQueryKeptValue {
  public:
-  Set(const XQueryJoinRelation& by, const Value& items) : _by(by), _items(items) {
-    if (by.relation.test == XQueryRelation::Equal) _texts = XQueryGrowingTexts::of(items);
-  }
+  Set(const XQueryJoinRelation& by, const Value& items) : _by(by), _items(items) {}
 
+  // False where the index has no answer.
+  bool takeIndex(XQueryContext& context) {
+    if (!isOfEquality()) return false;
+    if (const Items& items = listed()) {
+      _indexed = XQueryIndexedItems::of(items, XQueryValueWay(), context);
+    }
+    return _indexed != nullptr;
+  }
+  // For: no index, and the items are read from now on.
+  void takeTexts() {
+    if (!isOfEquality()) return;
+    if (const Items& items = listed()) XQueryIndexedItems::noteAsked(*items, XQueryValueWay());
+    _texts = XQueryGrowingTexts::of(_items);
+  }
   // Whether the table may be made: the same list has come a second time, or is long enough.
   void allowTable() { _mayMakeTable = true; }
   // Whether nothing can be an error that the items are compared with.
-  bool isRegular() { return _texts || (table() && _table->isRegular()); }
+  bool isRegular() { return _indexed || _texts || (table() && _table->isRegular()); }
   // Nothing for a probe that has to be compared the plain way.
   std::optional<bool> meets(const Value& probe) {
+    if (_indexed) {
+      const auto areMet = _indexed->holds(XQueryItemList(probe.get()), _looked);
+      if (!areMet || _indexed->isWorthATable(_looked)) leaveIndex();
+      if (areMet) return areMet;
+    }
     if (const auto areMet = _texts ? meetsTexts(probe) : std::nullopt) return areMet;
     return table() ? _table->meets(probe) : std::nullopt;
   }
 
  private:
+  using Items = XQueryJoinTable::Items;
+
+  bool isOfEquality() const {
+    return _by.relation.test == XQueryRelation::Equal && !_by.relation.negated;
+  }
+
+  void leaveIndex() {
+    _indexed = nullptr;
+    _texts = XQueryGrowingTexts::of(_items);
+    allowTable();
+  }
+  // Null for too many.
+  const Items& listed() {
+    if (_listed || _isRefused) return _listed;
+    const auto items = std::make_shared<std::vector<Value>>();
+    if (XQueryListItems(XQueryItemList(_items.get()), *items) && !items->empty() &&
+        items->size() <= XQueryJoinTable::mostItems) {
+      _listed = items;
+    }
+    _isRefused = !_listed;
+    return _listed;
+  }
   std::optional<bool> meetsTexts(const Value& probe) {
     const XQueryItemList list(probe.get());
     WorkPacer pacer;
@@ -74,24 +115,26 @@ class XQuerySetComparison::Set final : public XQueryKeptValue {
     return false;
   }
   XQueryJoinTable* table() {
-    if (_table || !_mayMakeTable || _isRefused) return _table.get();
-    const auto listed = std::make_shared<std::vector<Value>>();
-    if (XQueryListItems(XQueryItemList(_items.get()), *listed) &&
-        listed->size() <= XQueryJoinTable::mostItems) {
-      _table = std::make_unique<XQueryJoinTable>(
-          _by, listed, [&listed](size_t index) { return (*listed)[index]; });
-      if (!_table->isComplete()) _table = nullptr;
+    if (_table || !_mayMakeTable || !listed()) return _table.get();
+    _table = std::make_unique<XQueryJoinTable>(_by, _listed,
+                                               [this](size_t index) { return (*_listed)[index]; });
+    if (!_table->isComplete()) {
+      _table = nullptr;
+      _listed = nullptr;
+      _isRefused = true;
     }
-    _isRefused = !_table;
     return _table.get();
   }
 
   const XQueryJoinRelation _by;
   const Value _items;
+  Items _listed;
+  bool _isRefused = false;
+  std::unique_ptr<const XQueryIndexedItems> _indexed;
+  size_t _looked = 0;  // that the index has found
   std::unique_ptr<XQueryGrowingTexts> _texts;
   std::unique_ptr<XQueryJoinTable> _table;
   bool _mayMakeTable = false;
-  bool _isRefused = false;
 };
 
 Ref<XQuerySetComparison> XQuerySetComparison::exprWithPlain(Ref<XQueryOperatorExpr> plain,
@@ -101,6 +144,10 @@ Ref<XQuerySetComparison> XQuerySetComparison::exprWithPlain(Ref<XQueryOperatorEx
 
 XQuerySetComparison::XQuerySetComparison(Ref<XQueryOperatorExpr> plain, Again again)
     : XQueryPlannedExpr(plain), _comparison(*plain), _again(again) {}
+
+bool XQuerySetComparison::isOfEquality() const {
+  return _comparison.operatorType() == XQueryOperatorEqual;
+}
 
 Value XQuerySetComparison::computeValue(XQueryContext& context) const {
   const Value left = _comparison.left()->evaluateWithContext(context);
@@ -120,8 +167,8 @@ Value XQuerySetComparison::computeValue(XQueryContext& context) const {
   if (_again == Again::Left && leftCount >= fewItems) setIsLeft = true;
   if (_again == Again::Right && rightCount >= fewItems) setIsLeft = false;
   const bool isAgain = _again == Again::Both || _again == (setIsLeft ? Again::Left : Again::Right);
-  const bool areEqual = _comparison.operatorType() == XQueryOperatorEqual;
-  if (areEqual && isAgain && (setIsLeft ? leftCount : rightCount) >= fewItems) gain = Gain::IfAgain;
+  if (isOfEquality() && isAgain && (setIsLeft ? leftCount : rightCount) >= fewItems)
+    gain = Gain::IfAgain;
   if (work >= manyPairs) gain = Gain::AtOnce;
   const auto set = setOf(setIsLeft ? left : right, setIsLeft, gain, context);
   if (pairs == 0 && left && right && set && set->isRegular()) return NSNull::null();
@@ -141,15 +188,32 @@ std::shared_ptr<XQuerySetComparison::Set> XQuerySetComparison::setOf(const Value
   const std::array<Value, 2> dependencies = {items, NSNumber::numberWithBool(isLeft)};
   const auto use = gain == Gain::None ? keptValues.use(*this, dependencies, false, kept)
                                       : keptValues.useAtOnce(*this, dependencies, false, kept);
-  if (use == XQueryKeptValues::Use::First) return nullptr;
+  if (use == XQueryKeptValues::Use::First) {
+    auto made = indexedSet(items, isLeft, context);
+    if (made) keptValues.keep(*this, dependencies, made);
+    return made;
+  }
   auto set = std::static_pointer_cast<Set>(kept);
   if (use == XQueryKeptValues::Use::Second) {
     set = std::make_shared<Set>(relationOf(_comparison.operatorType(), isLeft), items);
+    if (!set->takeIndex(context)) set->takeTexts();
     keptValues.keep(*this, dependencies, set);
     if (gain == Gain::IfAgain) return set;
   }
   if (set) set->allowTable();
   return set;
+}
+
+// What the index of a tree answers costs no table, so that it need not be known whether the list
+// comes again.
+std::shared_ptr<XQuerySetComparison::Set> XQuerySetComparison::indexedSet(
+    const Value& items, bool isLeft, XQueryContext& context) const {
+  const XQueryItemList list(items.get());
+  if (!isOfEquality() || list.count() < XQueryIndexedItems::fewestItems) return nullptr;
+  if (!XQueryIndexedItems::mayAnswer(list[0], XQueryValueWay(), context)) return nullptr;
+  if (!XQueryAreSettled({&items, 1}, false)) return nullptr;
+  auto made = std::make_shared<Set>(relationOf(_comparison.operatorType(), isLeft), items);
+  return made->takeIndex(context) ? made : nullptr;
 }
 
 }  // namespace xquery

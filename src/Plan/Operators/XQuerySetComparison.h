@@ -32,8 +32,10 @@ class XQuerySetComparison : public XQueryPlannedExpr {
   class Set;
   // How much is known to be gained by a set.
   enum class Gain : uint8_t { None, IfAgain, AtOnce };
+  bool isOfEquality() const;
   std::shared_ptr<Set> setOf(const Value& items, bool isLeft, Gain gain,
                              XQueryContext& context) const;
+  std::shared_ptr<Set> indexedSet(const Value& items, bool isLeft, XQueryContext& context) const;
 
   const XQueryOperatorExpr& _comparison;
   const Again _again;

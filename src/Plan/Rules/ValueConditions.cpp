@@ -68,6 +68,17 @@ class Search {
     return isCallOf(expr, fn_not) ? ofNot(argumentOf(place), from, level + 1) : std::nullopt;
   }
 
+  std::optional<XQueryValueWay> wayFrom(XQueryPlaceID place,
+                                        const XQueryValueOrigin& origin) const {
+    place = inside(place);
+    if (isCallOf(*_program[place].expr, fn_data)) place = argumentOf(place);
+    XQueryValueWay way;
+    Start from;
+    from.origin = origin;
+    if (!readPath(*_program[place].expr, from, way)) return std::nullopt;
+    return way;
+  }
+
   bool isTextOfOne(XQueryPlaceID place) const {
     const XQueryExpr& expr = *_program[place].expr;
     if (!isCallOf(expr, fn_string) && !isCallOf(expr, fn_data)) return false;
@@ -399,6 +410,13 @@ std::optional<XQueryValueCondition> XQueryValueConditionIn(const XQueryPlanning&
   if (origin.varID != 0) start.own.add(origin.varID);
   if (!start.own.isExact()) return std::nullopt;
   return Search(planning).conditionIn(condition, start, 0);
+}
+
+std::optional<XQueryValueWay> XQueryWayFrom(const XQueryPlanning& planning, XQueryPlaceID place,
+                                            int64_t varID) {
+  XQueryValueOrigin origin;
+  origin.varID = varID;
+  return Search(planning).wayFrom(place, origin);
 }
 
 bool XQueryIsTextOfOne(const XQueryPlanning& planning, XQueryPlaceID place) {

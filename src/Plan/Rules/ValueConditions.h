@@ -38,6 +38,11 @@ std::optional<XQueryValueCondition> XQueryValueConditionIn(const XQueryPlanning&
                                                            XQueryPlaceID condition,
                                                            const XQueryValueOrigin& origin);
 
+// The way from the context item, or for another ID from the variable, to the values of a path
+// without predicates, or of what is passed through data(); nothing for another expression.
+std::optional<XQueryValueWay> XQueryWayFrom(const XQueryPlanning& planning, XQueryPlaceID place,
+                                            int64_t varID);
+
 // Whether the place is string() or data() of one node at most, which cannot fail.
 bool XQueryIsTextOfOne(const XQueryPlanning& planning, XQueryPlaceID place);
 
