@@ -5,6 +5,7 @@
 #include "Expr/XQuerySequence.h"
 #include "Plan/Paths/XQueryPathPattern.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Tree/TreeIndexes.h"
 
 #include <algorithm>
 
@@ -22,6 +23,17 @@ bool isAnsweredAtOnce(const XQueryWalkedPath& path, const NSXMLDocument& documen
          std::any_of(path.steps().begin(), path.steps().end(), [&](const XQueryWalkedStep& step) {
            return step.lookup && step.lookup->isReady(&document);
          });
+}
+
+// Whether the path finds so much more than there is to be asked for that walking it and merging the
+// two takes longer.
+bool isWorthAsking(const XQueryPathPattern& pattern, size_t count, const NSXMLDocument& document) {
+  constexpr size_t few = 64;
+  if (count <= few) return true;
+  const NSXMLIndexedWays known = NSXMLIndexedWays::of(&document);
+  const auto most = known.elements ? pattern.mostAsked(*known.elements) : std::nullopt;
+  constexpr uint64_t times = 3;
+  return most && *most / times > count;
 }
 
 }  // namespace
@@ -45,8 +57,11 @@ Value XQueryPathFilter::filtered(const XQueryExpr& operand, const XQueryWalkedPa
                                  XQueryContext& context) const {
   const Value items = operand.evaluateWithContext(context);
   if (XQueryHasFailed(items, context)) return {};
-  if (items && XQueryAllAreNodes(items) && documentOf(context)) {
-    return keptOf(items, path, context);
+  const NSXMLDocument* document = documentOf(context);
+  if (items && document && XQueryAllAreNodes(items)) {
+    XQueryPathPattern pattern(path, *document, context);
+    const size_t count = XQueryItemList(items.get()).count();
+    if (isWorthAsking(pattern, count, *document)) return keptOf(items, pattern, context);
   }
   const Value others = path.evaluateWithContext(context);
   if (XQueryHasFailed(others, context)) return {};
@@ -54,7 +69,7 @@ Value XQueryPathFilter::filtered(const XQueryExpr& operand, const XQueryWalkedPa
   return _operation->answerFor(isLeft ? items : others, isLeft ? others : items, context);
 }
 
-Value XQueryPathFilter::keptOf(const Value& items, const XQueryWalkedPath& path,
+Value XQueryPathFilter::keptOf(const Value& items, XQueryPathPattern& pattern,
                                XQueryContext& context) const {
   auto& dynamic = _internal(context);
   Value contextItem = dynamic.contextItem();
@@ -62,7 +77,6 @@ Value XQueryPathFilter::keptOf(const Value& items, const XQueryWalkedPath& path,
   const int64_t last = dynamic.last();
   const bool wantsFound = _operation->operatorType() == XQueryOperatorIntersect;
   const XQueryItemList list(items.get());
-  XQueryPathPattern pattern(path, *documentOf(context), context);
   XQueryGatherer kept;
   WorkPacer pacer;
   for (size_t i = 0; i < list.count(); ++i) {

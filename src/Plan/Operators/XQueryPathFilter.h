@@ -9,6 +9,8 @@
 
 namespace xquery {
 
+class XQueryPathPattern;
+
 class XQueryPathFilter : public XQueryPlannedExpr {
  public:
   // Operands of an "intersect" or "except" that fit a pattern (XQueryPathPattern.h); null for one
@@ -25,7 +27,8 @@ class XQueryPathFilter : public XQueryPlannedExpr {
   }
 
   // What the operator answers: one operand is evaluated, and the path that is the other one is
-  // asked for each of its nodes. A path that an index or a table answers at once is evaluated.
+  // asked for each of its nodes, where they are few beside those that the path would be walked to.
+  // Otherwise, and where an index or a table answers the path at once, it is evaluated.
   Value computeValue(XQueryContext& context) const override;
 
  protected:
@@ -37,7 +40,7 @@ class XQueryPathFilter : public XQueryPlannedExpr {
  private:
   Value filtered(const XQueryExpr& operand, const XQueryWalkedPath& path,
                  XQueryContext& context) const;
-  Value keptOf(const Value& items, const XQueryWalkedPath& path, XQueryContext& context) const;
+  Value keptOf(const Value& items, XQueryPathPattern& pattern, XQueryContext& context) const;
 
   const Ref<XQueryOperatorExpr> _operation;
   const Paths _paths;

@@ -72,6 +72,14 @@ bool XQueryPathPattern::findsElementsAlone(bool hasInstructions) const {
   return !hasInstructions || !last.test.acceptsInstructions();
 }
 
+std::optional<uint64_t> XQueryPathPattern::mostAsked(const NSXMLNameIndex& elements) const {
+  const Level& last = _levels.back();
+  if (last.step->axis == XQueryAxisAttribute) return std::nullopt;
+  if (const NSXMLExpandedName* name = last.test.onlyName()) return elements.nodes(name).size();
+  const NSXMLNameSelection* names = last.test.onlyNames();
+  return names ? std::optional(elements.count(*names, &_document, nullptr)) : std::nullopt;
+}
+
 // Predicates are asked when all names are right.
 bool XQueryPathPattern::finds(NSXMLNode* node) {
   std::array<NSXMLNode*, mostLevels> at{};

@@ -15,10 +15,13 @@
 #include "Expr/Paths/XQueryPathResults.h"
 #include "Expr/Paths/XQueryPathRun.h"
 #include "Plan/Paths/XQueryWalkedStep.h"
+#include "Platform/Tree/NameIndex.h"
 #include "xquery/XMLNode.h"
 
 #include <array>
 #include <cstddef>
+#include <cstdint>
+#include <optional>
 #include <vector>
 
 namespace xquery {
@@ -41,6 +44,9 @@ class XQueryPathPattern {
 
   // Whether no nodes but elements are found in the tree.
   bool findsElementsAlone(bool hasInstructions) const;
+  // Of how many nodes at most the last predicates are asked when the path is walked, where its last
+  // step asks for names of elements.
+  std::optional<uint64_t> mostAsked(const NSXMLNameIndex& elements) const;
   // False as well where a predicate comes to a limit, which the context says then. The focus is
   // left anywhere.
   bool finds(NSXMLNode* node);

@@ -6,7 +6,8 @@
 //             is not kept from elsewhere. Where it stands on the left, S is repeatable and leaves
 //             nothing in variables
 // Operator    XQueryPathFilter: each node of S is asked whether P finds it, by its name, its
-//             parents and the predicates of P
+//             parents and the predicates of P, where S turns out to be small beside what P is
+//             walked to
 // Why         P finds a node by that way alone, wherever it is looked for, and nobody can tell how
 //             far P was walked. Its predicates are asked of no node that they would not have been
 //             asked of. What S is and how it fails comes as before, P's document before or after it
