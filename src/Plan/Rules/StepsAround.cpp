@@ -2,6 +2,7 @@
 
 #include "Plan/Paths/XQueryWalkedPath.h"
 #include "Plan/Planning.h"
+#include "Plan/Rules/PathAt.h"
 #include "Platform/Base/WorkMeter.h"
 
 namespace xquery {
@@ -12,7 +13,10 @@ bool XQueryHidesFocusOf(const XQueryStep& step, const XQueryWalkedPath& path, XQ
     const XQueryPlaceID start = planning.program.part(place, XQueryRole::FirstStep);
     if (start == XQueryNoPlace) return false;
     const XQueryFacts& items = planning.facts[start];
-    if (!items.are(XQueryItems::Node) && items.most > 1) return false;
+    // Where a variable was read that may have held anything, a path of nodes may stand.
+    const XQueryWalkedPath* inner = XQueryWalkedPathAt(planning, start);
+    const bool areNodes = inner && inner->countsNodes();
+    if (!areNodes && !items.are(XQueryItems::Node) && items.most > 1) return false;
   }
   bool isPassed = path.start() == &step;
   WorkPacer pacer;
