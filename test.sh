@@ -6,6 +6,8 @@ set -u
 . "$(dirname "${BASH_SOURCE[0]}")/cmake/prepare.sh"
 
 preset=${XQUERY_PRESET:-release}
+# That build has the fuzz targets, which are clang's.
+[ "$preset" = asan ] && packages+=(clang libclang-rt-dev)
 need_packages "${packages[@]}" || exit 1
 (build "$preset" -DXQUERY_WERROR="${XQUERY_WERROR:-OFF}" \
   -DXQUERY_TESTS_OF="${XQUERY_TESTS_OF:-}") || exit 1

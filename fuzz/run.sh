@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# run.sh MINUTES [TARGET...]: builds fuzz targets into build/fuzz and runs one after another, those
+# run.sh MINUTES [TARGET...]: builds fuzz targets into build/asan and runs one after another, those
 # named or all, each for so many minutes (fractions are allowed). XQUERY_FUZZ_JOBS says how many
 # of them run at a time, one unless given. What makes one fail is kept under
 # build/fuzz/found/TARGET, what it has learnt under build/fuzz/corpus/TARGET for the next run;
@@ -16,7 +16,7 @@ cd "$top/fuzz" || exit 1
 targets=("$@")
 [ ${#targets[@]} -gt 0 ] || targets=(*.cpp)
 targets=("${targets[@]%.cpp}")
-(build fuzz -DXQUERY_WERROR="${XQUERY_WERROR:-OFF}" -- "${targets[@]/#/fuzz_}") || exit 1
+(build asan -- "${targets[@]/#/fuzz_}") || exit 1
 seconds=$(awk -v minutes="$minutes" 'BEGIN { all = int(minutes * 60); print (all > 1 ? all : 1) }')
 out=$top/build/fuzz
 results=$(mktemp -d)
@@ -31,7 +31,7 @@ run_target() {
   local options=(-max_total_time="$seconds" -timeout=30 -rss_limit_mb=3000 -print_final_stats=1
     -artifact_prefix="$found/")
   [ -f "dictionaries/$target.txt" ] && options+=(-dict="dictionaries/$target.txt")
-  if "$out/fuzz_$target" "${options[@]}" "$corpus" "seeds/$target" >"$log" 2>&1; then
+  if "$top/build/asan/fuzz_$target" "${options[@]}" "$corpus" "seeds/$target" >"$log" 2>&1; then
     echo "== $target, for $seconds s: $(awk '/number_of_executed_units/ { print $2 }' "$log") inputs"
   else
     echo "== $target, for $seconds s: found something"
