@@ -113,7 +113,7 @@ class XQueryShortWalk {
       if (!step.takes(found)) return true;
       goesOn = visitFrom(index + 1, found, visit);
       if (!goesOn || !mayBeSingle || !found->nextSibling()) return goesOn;
-      mayBeSingle = NSXMLTreeIndexes::isSingle(found);
+      mayBeSingle = NSXMLTreeIndexes::endsWalk(found);
       return !mayBeSingle;
     };
     if (step.axis == XQueryAxisChild) {

@@ -42,7 +42,7 @@ class XQueryNamedVisit {
     if (!isNamed || found->expandedName() != _name) return true;
     if (!_act(found)) return false;
     if (!_areChildren || !found->nextSibling()) return true;
-    _areChildren = NSXMLTreeIndexes::isSingle(found);
+    _areChildren = NSXMLTreeIndexes::endsWalk(found);
     return !_areChildren;
   }
   // In place of a walk, which would meet no attributes.

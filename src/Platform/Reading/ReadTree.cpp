@@ -52,6 +52,11 @@ NSXMLDocument* ReadTree::finish() {
   return cast<NSXMLDocument>(_builder.finish());
 }
 
+void ReadTree::abandon() {
+  _builder.endOpenNodes();
+  static_cast<void>(_builder.finish());
+}
+
 // --- texts -----------------------------------------------------------------------------------
 
 template <class Add>

@@ -32,6 +32,8 @@ class ReadTree {
   NSXMLTree& tree() { return _builder.tree(); }
   // The finished tree's root, which the caller must make a reference to.
   [[nodiscard]] NSXMLDocument* finish();
+  // For a tree that nobody goes on with: nothing is put down about it, which would take memory.
+  void abandon();
 
   // Names must have been adopted by the tree. Of an element, its namespaces and then its attributes
   // follow.

@@ -503,7 +503,7 @@ XMLPieces::XMLPieces(TextSource& source, uint32_t options, Leaving leaving)
 XMLPieces::~XMLPieces() = default;
 
 void XMLPieces::letGoOfTree() {
-  static_cast<void>(_reading->tree().finish());
+  _reading->tree().abandon();
 }
 
 size_t XMLPieces::read() {

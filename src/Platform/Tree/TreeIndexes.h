@@ -80,6 +80,17 @@ class NSXMLTreeIndexes {
     return known && known->_singleNames && known->_singleNames->contains(element->expandedName());
   }
 
+  // Whether a walk through the children of a node for those of the element's name may end with it.
+  // Not where the node after their parent is near: what lies in a row comes into the cache ahead of
+  // the walk, and going on through a few more nodes takes less than waiting for one elsewhere.
+  static bool endsWalk(const NSXMLNode* element) {
+    constexpr uintptr_t nearBytes = 1024;
+    const NSXMLNode* const behind = element->parent()->nextSibling();
+    const uintptr_t distance =
+        reinterpret_cast<uintptr_t>(behind) - reinterpret_cast<uintptr_t>(element);
+    return (!behind || distance >= nearBytes) && isSingle(element);
+  }
+
   // Each answers the index if there is one, or if it is worth making now; null for: walk. `work` is
   // how many nodes that walk will meet.
   const NSXMLNameIndex* elements(uint64_t work);

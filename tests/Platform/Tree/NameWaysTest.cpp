@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <array>
 #include <memory>
 #include <random>
@@ -95,7 +96,14 @@ TEST(XMLNameWays, HaveWhatAWalkFinds) {
         steps.back().isDeep = random() % 3 == 0;
       }
       const Nodes expected = walked(document.get(), steps);
-      ASSERT_EQ(index->countAlong(steps), expected.size());
+      const auto count = index->countAlong(steps);
+      if (!count) {
+        // What is below the last child of a last child is not all that "//" finds there.
+        EXPECT_TRUE(std::any_of(steps.begin() + 1, steps.end(),
+                                [](const NSXMLWayStep& step) { return step.isDeep; }));
+        continue;
+      }
+      ASSERT_EQ(*count, expected.size());
       const auto nodes = index->nodesAlong(steps);
       if (!steps.back().name) {
         EXPECT_FALSE(nodes);
