@@ -48,8 +48,8 @@ constexpr const char* afterwards =
 constexpr const char* made[] = {
     "let $s := (1 to 300000, 1)",
     "let $s := for $i in 1 to 60000 return concat('text', $i)",
-    "let $s := string-to-codepoints(string-join(for $i in 1 to 4000 return "
-    "'0123456789012345678901234567890123456789012345678901234567890123', ''))",
+    ("let $s := string-to-codepoints(string-join(for $i in 1 to 4000 return "
+     "'0123456789012345678901234567890123456789012345678901234567890123', ''))"),
     "let $s := for $i in 1 to 30000 return <a/>",
     "let $s := <a>{for $i in 1 to 30000 return element {concat('e', $i)} {()}}</a>",
 };
