@@ -14,8 +14,8 @@
 //                      one by scanning what it prints.
 #include "Plan/Operators/XQueryQuickArithmetic.h"
 
-#include "Expr/Operators/XQueryArithmetic.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Plan/Operators/XQueryMachineArithmetic.h"
 #include "Platform/Base/Counting.h"
 #include "Platform/Base/LastingObjects.h"
 #include "Types/XQueryNumber.h"
@@ -30,30 +30,12 @@ namespace {
 // --- small integers ------------------------------------------------------------------------------
 
 Value smallIntegerAnswer(int type, int64_t a, int64_t b) {
-  int64_t result = 0;
-  switch (type) {
-    case XQueryOperatorPlus:
-      if (__builtin_add_overflow(a, b, &result)) return Value();
-      break;
-    case XQueryOperatorMinus:
-      if (__builtin_sub_overflow(a, b, &result)) return Value();
-      break;
-    case XQueryOperatorMultiply:
-      if (__builtin_mul_overflow(a, b, &result)) return Value();
-      break;
-    case XQueryOperatorIDiv:
-    case XQueryOperatorMod:
-      // Dividing by -1 is left out: the smallest integer has no counterpart.
-      if (b == 0 || b == -1) return Value();
-      result = type == XQueryOperatorIDiv ? a / b : a % b;
-      break;
-    case XQueryOperatorDiv:
-      if (b == 0 || b == -1 || a % b != 0) return Value();
-      return XQueryNumber::numberWithDecimal(NSDecimal(a / b));
-    default:
-      return Value();
+  if (type == XQueryOperatorDiv) {
+    if (b == 0 || b == -1 || a % b != 0) return Value();
+    return XQueryNumber::numberWithDecimal(NSDecimal(a / b));
   }
-  return XQueryNumber::integerWithInt64(result);
+  const auto result = XQueryIntegerResult(type, a, b);
+  return result ? Value(XQueryNumber::integerWithInt64(*result)) : Value();
 }
 
 // --- decimals of any size ------------------------------------------------------------------------
@@ -89,26 +71,13 @@ Value exactAnswer(int type, const NSDecimal& a, const NSDecimal& b, bool bothInt
 // --- doubles -------------------------------------------------------------------------------------
 
 Value doubleAnswer(int type, double a, double b) {
-  switch (type) {
-    case XQueryOperatorPlus:
-      return XQueryNumber::numberWithDouble(a + b);
-    case XQueryOperatorMinus:
-      return XQueryNumber::numberWithDouble(a - b);
-    case XQueryOperatorMultiply:
-      return XQueryNumber::numberWithDouble(a * b);
-    case XQueryOperatorDiv:
-      return XQueryNumber::numberWithDouble(XQueryQuotient(a, b));
-    case XQueryOperatorMod:
-      return XQueryNumber::numberWithDouble(std::fmod(a, b));
-    case XQueryOperatorIDiv: {
-      if (b == 0) return Value();
-      const double quotient = std::trunc(a / b);
-      if (!(std::fabs(quotient) < static_cast<double>(XQueryExactIntegerBound))) return Value();
-      return XQueryNumber::integerWithInt64(static_cast<int64_t>(quotient));
-    }
-    default:
-      return Value();
+  if (const auto result = XQueryDoubleResult(type, a, b)) {
+    return XQueryNumber::numberWithDouble(*result);
   }
+  if (type != XQueryOperatorIDiv || b == 0) return Value();
+  const double quotient = std::trunc(a / b);
+  if (!(std::fabs(quotient) < static_cast<double>(XQueryExactIntegerBound))) return Value();
+  return XQueryNumber::integerWithInt64(static_cast<int64_t>(quotient));
 }
 
 Value answerFor(int type, const NSObject* left, const NSObject* right) {

@@ -1,9 +1,9 @@
 #include "Plan/Operators/XQueryScalarExpr.h"
 
 #include "Context/XQueryContextInternal.h"
-#include "Expr/Operators/XQueryArithmetic.h"
 #include "Expr/Operators/XQueryComparison.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Plan/Operators/XQueryMachineArithmetic.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryNumericOperand.h"
 
@@ -36,49 +36,6 @@ double asDouble(const Scalar& number) {
   return number.form == Form::Double ? number.number : static_cast<double>(number.integer);
 }
 
-Scalar ofIntegers(int type, int64_t a, int64_t b) {
-  int64_t result = 0;
-  bool isBeyond = false;
-  switch (type) {
-    case XQueryOperatorPlus:
-      isBeyond = __builtin_add_overflow(a, b, &result);
-      break;
-    case XQueryOperatorMinus:
-      isBeyond = __builtin_sub_overflow(a, b, &result);
-      break;
-    case XQueryOperatorMultiply:
-      isBeyond = __builtin_mul_overflow(a, b, &result);
-      break;
-    case XQueryOperatorIDiv:
-    case XQueryOperatorMod:
-      // Dividing by -1 is left out: the smallest integer has no counterpart.
-      isBeyond = b == 0 || b == -1;
-      if (!isBeyond) result = type == XQueryOperatorIDiv ? a / b : a % b;
-      break;
-    default:  // a quotient is a decimal
-      isBeyond = true;
-      break;
-  }
-  return isBeyond ? Scalar() : Scalar::ofInteger(result);
-}
-
-Scalar ofDoubles(int type, double a, double b) {
-  switch (type) {
-    case XQueryOperatorPlus:
-      return Scalar::ofDouble(a + b);
-    case XQueryOperatorMinus:
-      return Scalar::ofDouble(a - b);
-    case XQueryOperatorMultiply:
-      return Scalar::ofDouble(a * b);
-    case XQueryOperatorDiv:
-      return Scalar::ofDouble(XQueryQuotient(a, b));
-    case XQueryOperatorMod:
-      return Scalar::ofDouble(std::fmod(a, b));
-    default:  // an integer quotient may be beyond a word
-      return {};
-  }
-}
-
 Scalar arithmetic(int type, const Scalar& left, const Scalar& right) {
   // For idiv an untyped operand is an integer, which is not what a scanned double tells.
   const bool untypedOnes = type != XQueryOperatorIDiv;
@@ -86,10 +43,12 @@ Scalar arithmetic(int type, const Scalar& left, const Scalar& right) {
   const Scalar b = numberIn(right, untypedOnes);
   if (a.form == Form::Unknown || b.form == Form::Unknown) return {};
   if (a.form == Form::Integer && b.form == Form::Integer) {
-    return ofIntegers(type, a.integer, b.integer);
+    const auto result = XQueryIntegerResult(type, a.integer, b.integer);
+    return result ? Scalar::ofInteger(*result) : Scalar();
   }
   if (!isDoubleToo(a) || !isDoubleToo(b)) return {};
-  return ofDoubles(type, asDouble(a), asDouble(b));
+  const auto result = XQueryDoubleResult(type, asDouble(a), asDouble(b));
+  return result ? Scalar::ofDouble(*result) : Scalar();
 }
 
 template <class T>
