@@ -63,6 +63,12 @@ bool findsOne(const XQueryAxisStep& step) {
   }
 }
 
+// Whether a predicate asks for one position, the same whichever item it is asked of.
+bool isOneNumberForAll(const XQueryFacts& predicate) {
+  return predicate.are(Numeric) && predicate.most <= 1 && predicate.isRepeatable() &&
+         !predicate.does(XQueryDeeds::ReadsFocus);
+}
+
 // Follows the steps of one path.
 class Walk {
  public:
@@ -100,7 +106,7 @@ class Walk {
     for (size_t index = 0; index < step.predicates().size(); ++index) {
       if (!step.predicates()[index]) break;
       _items.filter();
-      if (step.asksForPosition(index)) _isOneOfEach = true;
+      if (step.asksForPosition(index) || isOneNumberForAll(_at.table[_part])) _isOneOfEach = true;
       _part = _at.program.nextPart(_part);
     }
   }

@@ -393,22 +393,60 @@ TEST(TakePositions, MakesTheNumberThePredicate) {
 // Worked out once for the nodes of a step, at the first of them.
 TEST(TakePositions, TakesNumbersThatAreTheSameForAllNodes) {
   const std::string loop = "for $i at $n in (1, 2) return ";
-  for (const char* path :
-       {"/r/a[$n + 1]", "//b[$n + 1]/@y", "//a/b[$n - 5]", "//a/b[$n * 1.4]", "//a[$n + 1][1]",
-        "//c/ancestor::*[$n + 0]", "//b/preceding-sibling::*[$n + 0]", "//a[b]/c[$n idiv 0]",
-        "//none[$n idiv 0]", "//b[xs:integer('x') + $n]", "//a/b[count($i)]",
-        "//*[self::a][$n + 1]", "(//b/../*[$n + 1], 'x')", "count(//a/b[$n + 1])",
-        "exists(//b[$n + 0])"}) {
+  for (const char* path : {"/r/a[$n + 1]",
+                           "//b[$n + 1]/@y",
+                           "//a/b[$n - 5]",
+                           "//a/b[$n * 1.4]",
+                           "//a[$n + 1][1]",
+                           "//c/ancestor::*[$n + 0]",
+                           "//b/preceding-sibling::*[$n + 0]",
+                           "//a[b]/c[$n idiv 0]",
+                           "//none[$n idiv 0]",
+                           "//b[xs:integer('x') + $n]",
+                           "//a/b[count($i)]",
+                           "//*[self::a][$n + 1]",
+                           "(//b/../*[$n + 1], 'x')",
+                           "count(//a/b[$n + 1])",
+                           "exists(//b[$n + 0])",
+                           "(//b)[$n + 1]",
+                           "(//b, 1)/a[$n + 1]",
+                           "//a/b[@y][$n + 1]",
+                           "(1, 'x', //a)[$n]",
+                           "(//b)[@y][$n]/..",
+                           "(1 to 5)[$n][$n]",
+                           "()[$n]",
+                           "'u'[$n]",
+                           "(//a)[$n idiv 0]",
+                           "(1, 2)[count($i) * 1.9]",
+                           "(//a)[$n + 0]/last()"}) {
     EXPECT_EQ(choicesOf("positions", loop + path), 1U) << path;
     resultOf(loop + path, names());
     resultOf(loop + path, manyNames());
   }
   for (const char* path : {"//b[$n + last()]", "//a/b[position() + 0]", "//b[count(@y)]",
-                           "//b[($n, 2)]", "//b[$n = 1]", "//a/b[@y][$n + 1]", "(//b)[$n + 1]",
-                           "//b[if ($n = 1) then 1 else @y]", "(//b, 1)/a[$n + 1]"}) {
+                           "//b[$n = 1]", "//b[if ($n = 1) then 1 else @y]", "(1, 2)[$n = 1]",
+                           "(//b)[trace($n, 'n')]", "(1, 2)[. + $n]"}) {
     EXPECT_EQ(choicesOf("positions", loop + path), 0U) << path;
     resultOf(loop + path, names());
     resultOf(loop + path, manyNames());
+  }
+}
+
+// What may be a number, and may be something else, is asked once whichever it is.
+TEST(TakePositions, AsksWhatMayBeAnythingOnce) {
+  const std::string loop =
+      "declare function local:at($l, $i) { ($l[$i], $l[$i]/self::a, //b[$i]/@y, //a[@x][$i]) }; "
+      "for $i in (0, 1, 2, 2.7, -1, 1e0, 3e9, number('u'), 'text', '', true(), false(), "
+      "xs:date('2004-01-01'), xs:float('2'), (//a)[1], //a/@x, 123456789012345678901234567890) "
+      "for $l in (1, 2) return ";
+  for (const char* list :
+       {"(//a)", "(1, //a)", "//b/@y", "(1 to 4)", "(7)", "()", "('p', 'q', 'r')"}) {
+    const std::string text = loop + "local:at(" + list + ", $i)";
+    EXPECT_GE(choicesOf("positions", text), 1U) << text;
+    resultOf(text, names());
+    resultOf(text, manyNames());
+    resultOf(loop + "local:at(" + list + ", ($i, 2))", names());
+    resultOf(loop + "local:at(" + list + ", ())", manyNames());
   }
 }
 

@@ -50,8 +50,20 @@ constexpr const char* bounds[] = {"$n",
                                   "true()",
                                   "last()",
                                   "position()",
-                                  "string-length($g/@n)"};
-constexpr const char* orders[] = {"<", "<=", ">", ">=", "lt", "le", "gt", "ge"};
+                                  "string-length($g/@n)",
+                                  "($n to $n + 2)",
+                                  "(-2 to $n)",
+                                  "(-5 to -1)",
+                                  "(2, 4)",
+                                  "(2, 1)",
+                                  "(1, 2, 'u')",
+                                  "(2.0, 3.0)",
+                                  "(1e0, 2e0)",
+                                  "(1, xs:int(2), 3)",
+                                  "(4294967297, 4294967298)",
+                                  "(18446744073709551617, 18446744073709551618)",
+                                  "(3, 3 + xs:integer('x'))"};
+constexpr const char* orders[] = {"<", "<=", ">", ">=", "lt", "le", "gt", "ge", "=", "eq"};
 constexpr const char* paths[] = {"$g/i[C]",
                                  "$g/i[C]/@k",
                                  "$g/i[@k > 2][C]",
@@ -97,14 +109,14 @@ TEST(PositionRanges, AreTakenAtOnce) {
        {"$g/i[position() <= $n]", "$l[position() < $n]", "$l[$n lt position()]",
         "$g/i[@k][position() >= $n]", "$g/i[position() > $n and position() < 2 * $n]",
         "$g/i[(position() > 1) and (position() < 5 and $n >= position())]",
-        "($g/i)[position() <= count($g/j)]", "$g/i[position() <= 2]/@k"}) {
+        "($g/i)[position() <= count($g/j)]", "$g/i[position() <= 2]/@k", "$g/i[position() = $n]",
+        "$l[$n eq position()]", "$l[position() = ($n to $n + 2)]"}) {
     EXPECT_EQ(choicesOf("ranges", loop + path), 1U) << path;
   }
   for (const char* path :
-       {"$g/i[position() = $n]", "$g/i[position() != $n]", "$g/i[position() <= last()]",
-        "$g/i[position() <= @k]", "$g/i[position() <= trace($n, 'n')]", "$g/i[@k <= $n]",
-        "$g/i[position() <= $n or @k]", "$g/i[position() <= $n and @k]",
-        "$g/i[position() <= 'u']"}) {
+       {"$g/i[position() != $n]", "$g/i[position() <= last()]", "$g/i[position() <= @k]",
+        "$g/i[position() <= trace($n, 'n')]", "$g/i[@k <= $n]", "$g/i[position() <= $n or @k]",
+        "$g/i[position() <= $n and @k]", "$g/i[position() <= 'u']"}) {
     EXPECT_EQ(choicesOf("ranges", loop + path), 0U) << path;
   }
 }

@@ -104,6 +104,7 @@ class ProgramGenerator {
   std::string earlier();
   // Where values stand in a list.
   std::string positions();
+  std::string asked();
   // What has a certain value, asked so often that an index of values is worth its making.
   std::string lookedUp(int depth);
   // The same in a list that a variable holds. `condition` writes one on an item.

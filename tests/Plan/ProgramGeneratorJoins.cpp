@@ -251,10 +251,23 @@ std::string ProgramGenerator::earlier() {
 }
 
 std::string ProgramGenerator::positions() {
+  if (_random.below(2)) return asked();
   const std::string list = _random.oneOf({"data(//@x)", "//*", "(//@*, 1, 2.5, 'u')", many()});
   return "(let $l := " + list + " for $u in " + many() + " return " +
          _random.oneOf({"", "count", "exists"}) + "(index-of($l, " +
          _random.oneOf({"string($u)", "$u", "number($u)", "data($u/@x)", "string($o/@x)"}) + ")))";
+}
+
+// Places that are worked out, of lists and of steps.
+std::string ProgramGenerator::asked() {
+  const std::string list =
+      _random.oneOf({"$l", "$l", "$l", "(1 to 5)", "//*", "$l/*", "//b/@*", "(//b, 'u')"});
+  const std::string place = _random.oneOf(
+      {"$n", "$n - 1", "$u", "$u/@x", "number($u)", "count($u/*)", "($n, 2)", "$n = 2",
+       "position() = $n", "position() = ($n to $n + 1)", "$n eq position()", "string($u)"});
+  return "(let $l := " + many() + " for $u at $n in " + _random.oneOf({"$l", "(1, 2, 3)"}) +
+         " return " + _random.oneOf({"", "count", "exists", "sum"}) + "(" + list + "[" + place +
+         "]" + _random.oneOf({"", "/..", "[1]", "[$n]", "/*"}) + "))";
 }
 
 std::string ProgramGenerator::lookedUp(int depth) {

@@ -52,9 +52,9 @@ class XQueryStep : public NSCounted {
   const std::optional<uint64_t>& literalPosition(size_t index) const {
     return _literalPositions[index];
   }
-  // Which position a predicate selects that is a number, or nothing, whatever the focus: 0 for
-  // none, also where it fails.
-  static uint64_t positionIn(const XQueryExpr& predicate, XQueryContext& context);
+  // Which position a predicate selects that answers the same whatever the focus: 0 for none, also
+  // where it fails; nothing where it keeps them all.
+  static std::optional<uint64_t> positionIn(const XQueryExpr& predicate, XQueryContext& context);
   bool asksForPosition(size_t index) const { return literalPosition(index).has_value(); }
   static std::optional<uint64_t> literalPositionOf(const XQueryExpr* predicate);
   // Whether evaluating its expressions may give a node a parent. Known once it is bound.

@@ -92,7 +92,8 @@ bool XQueryStep::keeps(const XQueryExpr& predicate, NSObject* item, int64_t posi
   return false;
 }
 
-uint64_t XQueryStep::positionIn(const XQueryExpr& predicate, XQueryContext& context) {
+std::optional<uint64_t> XQueryStep::positionIn(const XQueryExpr& predicate,
+                                               XQueryContext& context) {
   auto& dynamic = _internal(context);
   const int64_t position = dynamic.position();
   const int64_t last = dynamic.last();
@@ -105,9 +106,13 @@ uint64_t XQueryStep::positionIn(const XQueryExpr& predicate, XQueryContext& cont
     dynamic.setLast(last);
     return 0;
   }
-  if (!result || !XQueryIsNumericType(result.get())) return 0;
-  const auto* number = cast<NSNumber>(result);
-  return number->compare(*XQueryNumber::zero()) > 0 ? number->unsignedIntegerValue() : 0;
+  if (!result) return 0;
+  if (XQueryIsNumericType(result.get())) {
+    const auto* number = cast<NSNumber>(result);
+    return number->compare(*XQueryNumber::zero()) > 0 ? number->unsignedIntegerValue() : 0;
+  }
+  const bool isTrue = XQueryIsTrue(XQueryEffectiveBooleanValue(result, context));
+  return isTrue ? std::nullopt : std::optional<uint64_t>(0);
 }
 
 std::optional<uint64_t> XQueryStep::literalPositionOf(const XQueryExpr* predicate) {

@@ -272,19 +272,35 @@ bool XQueryPathWalk::filterNodes(const XQueryWalkedStep& step, size_t fromIndex,
                                  std::vector<NSXMLNode*>& nodes) {
   const auto& predicates = step.step->predicates();
   for (size_t index = fromIndex; index < predicates.size(); ++index) {
-    if (index == step.fromBack.predicate) {
-      const uint64_t behind = step.fromBack.behind;
+    if (index == step.positions.fromBack.predicate) {
+      const uint64_t behind = step.positions.fromBack.behind;
       const bool isThere = behind < nodes.size();
       if (isThere) nodes[0] = nodes[nodes.size() - 1 - behind];
       nodes.resize(isThere ? 1 : 0);
       continue;
     }
-    if (index == step.range.predicate && keepRange(step.range, nodes)) continue;
+    if (index == step.positions.sameForAll) {
+      if (!keepAtOnce(*predicates[index], nodes)) return false;
+      continue;
+    }
+    if (index == step.positions.range.predicate && keepRange(step.positions.range, nodes)) continue;
     const XQueryNodeQuestion* question =
         step.step->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicates[index].get());
     if (!question) return step.step->filterNodes(nodes, index, context);
     if (!keepNodes(*predicates[index], *question, nodes)) return false;
   }
+  return true;
+}
+
+// Of a predicate that answers the same for all nodes; false when a limit was reached.
+bool XQueryPathWalk::keepAtOnce(const XQueryExpr& predicate, std::vector<NSXMLNode*>& nodes) {
+  if (nodes.empty()) return true;
+  const auto position = XQueryStep::positionIn(predicate, context);
+  if (_internal(context).isFailing()) return false;
+  if (!position) return true;
+  const bool isThere = *position >= 1 && *position <= nodes.size();
+  if (isThere) nodes[0] = nodes[*position - 1];
+  nodes.resize(isThere ? 1 : 0);
   return true;
 }
 
@@ -428,13 +444,15 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
     });
     return first + 1;
   }
-  if (step.computedPosition == first && !listingStep && !step.testMayRaise) {
+  const bool isComputed = step.isPositionComputed && step.positions.sameForAll == first;
+  if (isComputed && !listingStep && !step.testMayRaise) {
     collectComputed(step, axis, node, nodes);
     return first + 1;
   }
-  const bool hasRange = step.range.predicate == first && !listingStep && !step.testMayRaise;
+  const bool hasRange =
+      step.positions.range.predicate == first && !listingStep && !step.testMayRaise;
   if (hasRange && collectRange(step, axis, node, nodes)) return first + 1;
-  const bool isFromBack = step.fromBack.predicate == first && axis == XQueryAxisChild;
+  const bool isFromBack = step.positions.fromBack.predicate == first && axis == XQueryAxisChild;
   if (isFromBack && !listingStep && !step.testMayRaise) {
     collectFromBack(step, node, nodes);
     return first + 1;
@@ -467,7 +485,7 @@ void XQueryPathWalk::collectComputed(const XQueryWalkedStep& step, int axis, NSX
   std::optional<uint64_t> left;
   XQueryWalkAnyAxis(node, axis, true, [&](NSXMLNode* found) {
     if (!test.matches(found)) return true;
-    if (!left) left = step.step->positionIn(*step.firstPredicate()->get(), context);
+    if (!left) left = XQueryStep::positionIn(*step.firstPredicate()->get(), context).value_or(0);
     if (*left == 0 || --*left > 0) return *left > 0;
     nodes.push_back(found);
     return false;
@@ -484,7 +502,7 @@ bool XQueryPathWalk::collectRange(const XQueryWalkedStep& step, int axis, NSXMLN
   uint64_t position = 0;
   XQueryWalkAnyAxis(node, axis, true, [&](NSXMLNode* found) {
     if (!test.matches(found)) return true;
-    if (!positions) positions = step.range.positions(context);
+    if (!positions) positions = step.positions.range.positions(context);
     isOpen = positions.has_value();
     if (!isOpen || ++position > positions->last) return false;
     if (position >= positions->first) nodes.push_back(found);
@@ -496,7 +514,7 @@ bool XQueryPathWalk::collectRange(const XQueryWalkedStep& step, int axis, NSXMLN
 void XQueryPathWalk::collectFromBack(const XQueryWalkedStep& step, const NSXMLNode* node,
                                      std::vector<NSXMLNode*>& nodes) {
   XQueryStepTest test(step, *this);
-  uint64_t left = step.fromBack.behind + 1;
+  uint64_t left = step.positions.fromBack.behind + 1;
   const auto visit = [&](NSXMLNode* found) {
     if (!test.matches(found) || --left > 0) return true;
     nodes.push_back(found);

@@ -131,6 +131,7 @@ class XQueryPathWalk : public XQueryPathRun {
   bool filtersEach(const XQueryWalkedStep& step) const;
   bool keepsAlone(const XQueryWalkedStep& step, size_t firstPredicate, NSXMLNode* node);
   bool filterNodes(const XQueryWalkedStep& step, size_t fromIndex, std::vector<NSXMLNode*>& nodes);
+  bool keepAtOnce(const XQueryExpr& predicate, std::vector<NSXMLNode*>& nodes);
   bool keepRange(const XQueryPositionRange& range, std::vector<NSXMLNode*>& nodes);
   bool keepNodes(const XQueryExpr& predicate, const XQueryNodeQuestion& question,
                  std::vector<NSXMLNode*>& nodes);

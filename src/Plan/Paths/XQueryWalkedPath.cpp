@@ -90,6 +90,24 @@ Value itemFromBack(const Value& items, uint64_t behind) {
   return kept.value();
 }
 
+// As a predicate keeps them that answers the same for all; null when a limit was reached.
+Value itemsChosenAtOnce(const Value& items, const XQueryExpr& predicate, XQueryContext& context) {
+  const XQueryItemList list(items.get());
+  if (list.count() == 0) return items;
+  const auto position = XQueryStep::positionIn(predicate, context);
+  if (_internal(context).isFailing()) return {};
+  XQueryGatherer kept;
+  WorkPacer pacer;
+  const size_t first = position.value_or(1) - 1;  // far behind the last for none
+  const size_t end = position && first < list.count() ? first + 1 : list.count();
+  for (size_t i = first; i < end; ++i) {
+    pacer.turn();
+    NSObject* item = list[i];
+    if (item && item->kind() != Kind::Null) kept.add(item);
+  }
+  return kept.value();
+}
+
 // As a predicate keeps them that asks for these positions; null where it has to be asked.
 Value itemsInRange(const Value& items, const XQueryPositionRange& range, XQueryContext& context) {
   const XQueryItemList list(items.get());
@@ -162,6 +180,14 @@ void XQueryWalkedPath::takeSteps(XQueryWalkedPath& of) {
   _steps.insert(_steps.begin(), std::make_move_iterator(of._steps.begin()),
                 std::make_move_iterator(of._steps.end()));
   of._steps.clear();
+}
+
+XQueryStepPositions* XQueryWalkedPath::positionsOf(const XQueryStep& step) {
+  if (_start == &step) return &_startPositions;
+  for (XQueryWalkedStep& each : _steps) {
+    if (each.step == &step) return each.isExpression() ? nullptr : &each.positions;
+  }
+  return nullptr;
 }
 
 const XQueryWalkedStep* XQueryWalkedPath::walked(const XQueryStep& asWritten) const {
@@ -335,13 +361,19 @@ Value XQueryWalkedPath::evaluateStart(XQueryContext& context,
   size_t index = 0;
   for (const auto& predicate : _start->predicates()) {
     if (!items) break;  // there is no context item
-    if (index == _startFromBack.predicate) {
-      items = itemFromBack(items, _startFromBack.behind);
+    if (index == _startPositions.fromBack.predicate) {
+      items = itemFromBack(items, _startPositions.fromBack.behind);
       ++index;
       continue;
     }
-    if (index == _startRange.predicate) {
-      if (Value inRange = itemsInRange(items, _startRange, context)) {
+    if (index == _startPositions.sameForAll) {
+      items = itemsChosenAtOnce(items, *predicate, context);
+      if (!items) return {};
+      ++index;
+      continue;
+    }
+    if (index == _startPositions.range.predicate) {
+      if (Value inRange = itemsInRange(items, _startPositions.range, context)) {
         items = std::move(inRange);
         ++index;
         continue;

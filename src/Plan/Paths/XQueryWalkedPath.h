@@ -85,9 +85,8 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   std::vector<XQueryWalkedStep>& changeableSteps() { return _steps; }
   // Puts the steps of another path, which this one begins with, before its own.
   void takeSteps(XQueryWalkedPath& of);
-  // That of the start.
-  XQueryFromBack& startFromBack() { return _startFromBack; }
-  XQueryPositionRange& startRange() { return _startRange; }
+  // What is told about the predicates of the start, or of an axis step; null for other steps.
+  XQueryStepPositions* positionsOf(const XQueryStep& step);
   // The items of the start are nodes in document order, and of one tree.
   void noteStartInOrder() { _isStartInOrder = true; }
   void setFindings(const Findings& findings) {
@@ -116,8 +115,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
 
   const Ref<XQueryPathExpr> _path;
   const XQueryStep* _start = nullptr;
-  XQueryFromBack _startFromBack;
-  XQueryPositionRange _startRange;
+  XQueryStepPositions _startPositions;
   bool _isStartInOrder = false;
   std::vector<XQueryWalkedStep> _steps;
   bool _hasPredicates = false;

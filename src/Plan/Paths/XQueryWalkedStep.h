@@ -22,6 +22,16 @@ struct XQueryFromBack {
   uint64_t behind = 0;  // the number of items behind the one that is asked for
 };
 
+// The predicates of a step that need not be asked of each item, by their numbers.
+struct XQueryStepPositions {
+  static constexpr size_t noPredicate = SIZE_MAX;
+  XQueryFromBack fromBack;
+  // Keeps the items from one position to another.
+  XQueryPositionRange range;
+  // Answers the same for all items: a position, or whether they are kept.
+  size_t sameForAll = noPredicate;
+};
+
 struct XQueryWalkedStep {
   static constexpr size_t noTrail = SIZE_MAX;
 
@@ -84,12 +94,9 @@ struct XQueryWalkedStep {
   bool filtersEach = false;
   bool asksForWays = false;
   bool gathersFirst = false;
-  // The predicate that is a number, the same for all nodes; noPredicate for none.
-  static constexpr size_t noPredicate = SIZE_MAX;
-  size_t computedPosition = noPredicate;
-  XQueryFromBack fromBack;
-  // The predicate that keeps the nodes from one position to another.
-  XQueryPositionRange range;
+  XQueryStepPositions positions;
+  // What is the same for all nodes is a number, so that the step walks no further than that.
+  bool isPositionComputed = false;
   size_t trail = noTrail;
 };
 

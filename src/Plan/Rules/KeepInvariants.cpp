@@ -3,7 +3,8 @@
 // Pattern     an expression that is evaluated again and again, by a clause, a predicate, a step, a
 //             quantifier or the calls of a function around it, reads nothing that differs from one
 //             time to the next, and takes more work than looking that up: it holds a path of some
-//             length, a FLWOR, a quantifier or a call of a declared function
+//             length, a FLWOR, a quantifier, a call of a declared function or of a built-in one
+//             that goes through all items of a list
 // Facts       it is repeatable; all that it reads is known one by one; its items are nodes, or
 //             which objects they are cannot be told
 // Operator    XQueryKeptExpr: evaluates it when it is first needed, and keeps the outcome
@@ -16,12 +17,19 @@
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
+#include "Functions/Aggregate.h"
+#include "Functions/DeepEqual.h"
+#include "Functions/Sequence.h"
+#include "Functions/String.h"
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Operators/XQueryKeptExpr.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 
+#include <algorithm>
+#include <iterator>
 #include <string_view>
+#include <vector>
 
 namespace xquery {
 namespace {
@@ -58,6 +66,15 @@ bool isShort(const XQueryPathExpr& path) {
   return true;
 }
 
+// Whether a call takes the longer the more items its arguments have.
+bool goesThroughItems(const XQueryFunctionCall& call) {
+  constexpr XQueryProcedure functions[] = {fn_sum,         fn_avg,      fn_max,
+                                           fn_min,         fn_index_of, fn_distinct_values,
+                                           fn_string_join, fn_reverse,  fn_deep_equal};
+  return std::find(std::begin(functions), std::end(functions), call.function()) !=
+         std::end(functions);
+}
+
 class Search {
  public:
   explicit Search(XQueryPlanning& planning)
@@ -67,7 +84,7 @@ class Search {
 
   void run() {
     for (const XQueryPlaceID place : _program.partsFirst()) {
-      _isLaborious[place] = _isLaborious[place] || isLaborious(*at(place).expr) || isWalked(place);
+      _isLaborious[place] = _isLaborious[place] || isLaborious(place) || isWalked(place);
       const XQueryPlaceID whole = at(place).parent;
       if (whole != XQueryNoPlace && _isLaborious[place]) _isLaborious[whole] = true;
     }
@@ -80,18 +97,31 @@ class Search {
   const XQueryPlace& at(XQueryPlaceID place) const { return _program[place]; }
   const XQueryFacts& facts(XQueryPlaceID place) const { return _planning.facts[place]; }
 
-  static bool isLaborious(const XQueryExpr& expr) {
+  bool isLaborious(XQueryPlaceID place) const {
+    const XQueryExpr& expr = *at(place).expr;
     switch (expr.kind()) {
       case Kind::PathExpr:
         return !isShort(*cast<XQueryPathExpr>(&expr));
       case Kind::FLWORExpr:
       case Kind::QuantifiedExpr:
         return true;
-      case Kind::FunctionCall:
-        return cast<XQueryFunctionCall>(&expr)->functionDecl() != nullptr;
+      case Kind::FunctionCall: {
+        const auto& call = *cast<XQueryFunctionCall>(&expr);
+        return call.functionDecl() || (goesThroughItems(call) && hasListArgument(place));
+      }
       default:
         return false;
     }
+  }
+
+  bool hasListArgument(XQueryPlaceID call) const {
+    const XQueryPlaceID arguments = _program.part(call, XQueryRole::Arguments);
+    if (arguments == XQueryNoPlace) return false;
+    for (XQueryPlaceID each = _program.firstPart(arguments); each != XQueryNoPlace;
+         each = _program.nextPart(each)) {
+      if (facts(each).most == XQueryFacts::many) return true;
+    }
+    return false;
   }
 
   // Joins know the items of a clause again by the list that they stand in.

@@ -1,15 +1,16 @@
 // The items from one position to another.
 //
-// Pattern     a[position() <= $n], $l[position() > 2 and $n >= position()]: one or more comparisons
-//             of the position by an order, joined by "and"
+// Pattern     a[position() <= $n], $l[position() > 2 and $n >= position()], $l[position() = $n]:
+// one
+//             or more comparisons of the position by an order or for equality, joined by "and"
 // Facts       what the position is compared with is repeatable and reads no focus; nothing shows
 //             the focus that the predicate leaves (StepsAround.h)
 // Operator    none: the step is told (XQueryPositionRange). It works the positions out once for all
 //             of its items, takes these, and walks no further
 // Why         a comparison with one number answers the same for a position whichever item stands
-//             there, and the positions for which it holds stand in a row. Without items nothing is
-//             compared; where what the position is compared with fails, or is no number, the
-//             predicate is asked of each item
+//             there, and the positions for which it holds stand in a row; so do those that equal
+//             one of the integers of "$n to $m". Without items nothing is compared; where what the
+//             position is compared with fails, or is neither, the predicate is asked of each item
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLists.h"
 #include "Plan/Planning.h"
@@ -25,8 +26,10 @@
 namespace xquery {
 namespace {
 
-bool isOrder(int type) {
+bool keepsRow(int type) {
   switch (type) {
+    case XQueryOperatorEqual:
+    case XQueryOperatorEq:
     case XQueryOperatorLess:
     case XQueryOperatorLessEqual:
     case XQueryOperatorGreater:
@@ -58,14 +61,11 @@ class Search {
     if (!isAll && !XQueryHidesFocusOf(*here.step, *path, here.parent, _planning)) {
       return _planning.refuse(place, "an error that comes up later may show the focus it leaves");
     }
-    XQueryPositionRange* of = rangeOf(*here.step, *path);
-    const auto& predicates = here.step->predicates();
-    for (size_t index = 0; of && index < predicates.size(); ++index) {
-      if (&*here.slot == &predicates[index]) range->predicate = index;
-    }
-    if (!of || range->predicate == XQueryPositionRange::noPredicate) return;
-    if (of->predicate != XQueryPositionRange::noPredicate) return;
-    *of = *std::move(range);
+    XQueryStepPositions* of = path->positionsOf(*here.step);
+    const auto index = XQueryPredicateAt(here);
+    if (!of || !index || of->range.predicate != XQueryPositionRange::noPredicate) return;
+    range->predicate = *index;
+    of->range = *std::move(range);
     _planning.choose(place);
   }
 
@@ -92,7 +92,7 @@ class Search {
   }
 
   bool add(XQueryPlaceID place, XQueryOperatorExpr& comparison, XQueryPositionRange& range) const {
-    if (!isOrder(comparison.operatorType())) return false;
+    if (!keepsRow(comparison.operatorType())) return false;
     const bool isOnLeft = XQueryIsPosition(comparison.left());
     if (!isOnLeft && !XQueryIsPosition(comparison.right())) return false;
     const XQueryPlaceID left = _program.firstPart(place);
@@ -107,14 +107,6 @@ class Search {
   static bool isForAll(const XQueryFacts& facts) {
     return facts.mayBe(XQueryItems::Numeric) && facts.isRepeatable() && facts.assigns.isEmpty() &&
            !facts.does(XQueryDeeds::ReadsFocus | XQueryDeeds::LoadsDocuments);
-  }
-
-  static XQueryPositionRange* rangeOf(const XQueryStep& step, XQueryWalkedPath& path) {
-    if (path.start() == &step) return &path.startRange();
-    for (XQueryWalkedStep& each : path.changeableSteps()) {
-      if (each.step == &step) return each.isExpression() ? nullptr : &each.range;
-    }
-    return nullptr;
   }
 
   XQueryPlanning& _planning;

@@ -1,16 +1,18 @@
 // Positions that a step could have been asked for by number.
 //
-// Pattern     a[position() = 3], a[3 eq position()]; a[$i + 1]; a[last()], (//a)[last() - 1],
+// Pattern     a[position() = 3], a[3 eq position()]; a[$i + 1], $l[$i]; a[last()], (//a)[last() -
+// 1],
 //             $l[position() = last()]
-// Facts       the number is an integer, 1 or more, or an expression that answers nothing else,
-//             reads no focus and is repeatable; nothing shows the focus that the predicate leaves
+// Facts       the number is an integer, 1 or more, or an expression that may answer numbers, reads
+//             no focus and is repeatable; nothing shows the focus that the predicate leaves
 //             (StepsAround.h)
 // Operator    none: the predicate is the number, so that the step walks no further than that; an
-//             expression is evaluated once for the nodes of the step and not for each of them; what
+//             expression is evaluated once for the items of the step and not for each of them; what
 //             is counted from the back is taken from there, and children are walked from the last
-// Why         a number in a predicate asks for that position; without nodes it is not evaluated,
-//             and an error in it drops each of them; "last()" is the number of the items, and
-//             subtracting from it fails for none
+// Why         a number in a predicate asks for that position, and anything else that is the same
+//             for all items keeps all of them or none; without items it is not evaluated, and an
+//             error in it drops each of them; "last()" is the number of the items, and subtracting
+//             from it fails for none
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Planning.h"
@@ -24,9 +26,9 @@ namespace xquery {
 
 namespace {
 
-bool isPositionForAll(const XQueryFacts& facts) {
-  return facts.are(XQueryItems::Numeric) && facts.most <= 1 && facts.isRepeatable() &&
-         facts.assigns.isEmpty() &&
+// For what is no number in any case, asking each item costs little.
+bool isSameForAll(const XQueryFacts& facts) {
+  return facts.mayBe(XQueryItems::Numeric) && facts.isRepeatable() && facts.assigns.isEmpty() &&
          !facts.does(XQueryDeeds::ReadsFocus | XQueryDeeds::LoadsDocuments);
 }
 
@@ -44,7 +46,8 @@ class Search {
     const bool isAll = path->start() == here.step && path->steps().empty();
     const bool hidesFocus = XQueryHidesFocusOf(*here.step, *path, here.parent, _planning);
     if ((isAll || hidesFocus) && takeFromBack(place, *path)) return;
-    if (hidesFocus && !takeNumber(place, *path)) takeExpression(place, *path);
+    if (hidesFocus && takeNumber(place, *path)) return;
+    if (isAll || hidesFocus) takeExpression(place, *path);
   }
 
  private:
@@ -65,35 +68,30 @@ class Search {
   bool takeFromBack(XQueryPlaceID place, XQueryWalkedPath& path) {
     const XQueryPlace& here = _planning.program[place];
     const auto behind = XQueryItemsBehindAskedFor(*here.expr);
-    XQueryFromBack* fromBack = behind ? fromBackOf(*here.step, path) : nullptr;
-    if (!fromBack || fromBack->predicate != XQueryFromBack::noPredicate) return false;
-    const auto& predicates = here.step->predicates();
-    for (size_t index = 0; index < predicates.size(); ++index) {
-      if (&*here.slot == &predicates[index]) *fromBack = {index, *behind};
-    }
-    if (fromBack->predicate == XQueryFromBack::noPredicate) return false;
+    XQueryStepPositions* of = behind ? path.positionsOf(*here.step) : nullptr;
+    const auto index = XQueryPredicateAt(here);
+    if (!of || !index || of->fromBack.predicate != XQueryFromBack::noPredicate) return false;
+    of->fromBack = {*index, *behind};
     _planning.choose(place, "the position is counted from the back");
     return true;
   }
 
-  static XQueryFromBack* fromBackOf(const XQueryStep& step, XQueryWalkedPath& path) {
-    if (path.start() == &step) return &path.startFromBack();
-    for (XQueryWalkedStep& each : path.changeableSteps()) {
-      if (each.step == &step) return each.isExpression() ? nullptr : &each.fromBack;
-    }
-    return nullptr;
-  }
-
-  // Of the first predicate of an axis step that is no part of its test.
+  // Of the start, or of an axis step behind what is part of its test.
   void takeExpression(XQueryPlaceID place, XQueryWalkedPath& path) {
     const XQueryPlace& here = _planning.program[place];
-    if (!isPositionForAll(_planning.facts[place])) return;
+    const XQueryFacts& facts = _planning.facts[place];
+    XQueryStepPositions* of = isSameForAll(facts) ? path.positionsOf(*here.step) : nullptr;
+    const auto index = XQueryPredicateAt(here);
+    if (!of || !index || of->sameForAll != XQueryStepPositions::noPredicate) return;
+    const bool isNumber = facts.are(XQueryItems::Numeric) && facts.most <= 1;
     for (XQueryWalkedStep& step : path.changeableSteps()) {
-      if (step.step != here.step || step.isExpression() || !step.hasPredicates()) continue;
-      if (&*here.slot != &*step.firstPredicate()) continue;
-      step.computedPosition = step.predicatesInTest;
-      _planning.choose(place, "the number is worked out once, and the step walks no further");
+      if (step.step != here.step) continue;
+      if (*index < step.predicatesInTest) return;
+      step.isPositionComputed = isNumber && *index == step.predicatesInTest;
     }
+    of->sameForAll = *index;
+    _planning.choose(place, isNumber ? "the number is worked out once, and the step goes no further"
+                                     : "what is the same for all items is worked out once");
   }
 
   XQueryPlanning& _planning;

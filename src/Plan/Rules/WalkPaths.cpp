@@ -10,6 +10,8 @@
 #include "Plan/Rules.h"
 #include "Plan/Rules/PathAt.h"
 
+#include <algorithm>
+
 namespace xquery {
 
 XQueryWalkedPath* XQueryWalkedPathAt(const XQueryPlanning& planning, XQueryPlaceID place) {
@@ -17,6 +19,14 @@ XQueryWalkedPath* XQueryWalkedPathAt(const XQueryPlanning& planning, XQueryPlace
   const auto* expr = dyn_cast<XQueryPlannedExpr>(there.get());
   while (expr && !expr->walkedPath()) expr = dyn_cast<XQueryPlannedExpr>(&expr->plain());
   return expr ? const_cast<XQueryWalkedPath*>(expr->walkedPath()) : nullptr;
+}
+
+std::optional<size_t> XQueryPredicateAt(const XQueryPlace& place) {
+  const auto& predicates = place.step->predicates();
+  const auto found = std::find_if(predicates.begin(), predicates.end(),
+                                  [&](const auto& each) { return &each == place.slot; });
+  if (found == predicates.end()) return std::nullopt;
+  return static_cast<size_t>(found - predicates.begin());
 }
 
 void XQueryWalkPaths(XQueryPlanning& planning) {
