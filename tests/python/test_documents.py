@@ -132,6 +132,16 @@ def test_no_source() -> None:
             xquery.parse(source)  # type: ignore[arg-type]
 
 
+@pytest.mark.parametrize("answer", [5, None, ["<a/>"]])
+def test_a_file_object_answers_bytes_or_a_str(answer: object) -> None:
+    class Other:
+        def read(self, size: int = -1) -> bytes:
+            return answer  # type: ignore[return-value]
+
+    with pytest.raises(TypeError, match="read\\(\\) answers bytes or a str, not "):
+        xquery.parse(Other())
+
+
 def test_what_reading_raises_is_raised() -> None:
     class Broken(io.RawIOBase):
         def readinto(self, buffer: object) -> int:

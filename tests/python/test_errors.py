@@ -87,6 +87,9 @@ def test_limits() -> None:
         xquery.compile("1", seconds=0)
     with pytest.raises(ValueError):
         xquery.compile("1", seconds=-1)
+    with pytest.raises(ValueError, match="memory must not be negative"):
+        xquery.compile("1", memory=-1)
+    assert xquery.compile("1", memory=2**70).evaluate().one() == 1
 
 
 @pytest.mark.parametrize("text", ["1 +", "1 idiv 0", "<p:a/>"])

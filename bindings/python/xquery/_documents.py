@@ -152,6 +152,9 @@ def parse(
     if hasattr(source, "read"):
         data = source.read()
         name = getattr(source, "name", "document")
-        text = _utf8(data) if isinstance(data, str) else data
-        return _from_bytes(text, str(name), html, strip_space, compiled)
+        if isinstance(data, str):
+            data = _utf8(data)
+        elif not isinstance(data, (bytes, bytearray, memoryview)):
+            raise TypeError(f"read() answers bytes or a str, not {type(data).__name__}")
+        return _from_bytes(data, str(name), html, strip_space, compiled)
     raise TypeError(f"a document cannot be read from {type(source).__name__}")

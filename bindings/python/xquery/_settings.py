@@ -121,13 +121,15 @@ class Settings:
 
     def made(self) -> _xquery.Settings:
         """The same for the library."""
+        if self.memory is not None and self.memory < 0:
+            raise ValueError("memory must not be negative")
         base = self.base()
         modules = self.modules
         if isinstance(modules, Mapping):
             modules = _found_in(modules, base)
         return _xquery.Settings(
             seconds=self.seconds,
-            memory=self.memory,
+            memory=None if self.memory is None else min(self.memory, 2**64 - 1),
             policy=self.policy.rules,
             url=base,
             namespaces=dict(self.namespaces or {}),
