@@ -221,6 +221,15 @@ void Parse::hearError(void*, xmlError* error) {
 
 void Parse::hearText(void*, const char*, ...) {}
 
+// The parser has no words for some of its errors, such as the end of the input at the beginning of
+// a CDATA section, for which it has them further on.
+const char* messageOf(const xmlError& error) {
+  if (!error.message || !std::string_view(error.message).starts_with("Unregistered")) {
+    return error.message;
+  }
+  return error.code == XML_ERR_CDATA_NOT_FINISHED ? "CData section not finished" : nullptr;
+}
+
 void Parse::hear(const xmlError& error) {
   // Neither warnings, of URIs that are relative or none, nor breaches of validity and of good
   // sense, for example a token that an enumeration has twice or a predefined entity declared
@@ -235,9 +244,9 @@ void Parse::hear(const xmlError& error) {
       !_parser || (error.domain != XML_FROM_PARSER && error.domain != XML_FROM_NAMESPACE);
   // Nor can the parser that was at work last, which may be gone.
   if (_parser) _atWork = _parser;
-  if (!isOfInput) return failAt(error.message, error.line, error.int2);
+  if (!isOfInput) return failAt(messageOf(error), error.line, error.int2);
   const xmlParserInput* input = _parser ? _parser->input : nullptr;
-  note(error.message, input ? input->line : 0, input ? input->col : 0);
+  note(messageOf(error), input ? input->line : 0, input ? input->col : 0);
 }
 
 // --- input -----------------------------------------------------------------------------------

@@ -250,6 +250,9 @@ TEST(XMLParser, BadInputIsAnErrorWithItsPlace) {
       {"<a>&#0;</a>", 1, 8, "xmlParseCharRef: invalid xmlChar value 0"},
       {"<a>\x01</a>", 1, 4, "PCDATA invalid Char value 1"},
       {"<a>x]]>y</a>", 1, 5, "Sequence ']]>' not allowed in content"},
+      {"<a><![CDATA[", 1, 13, "CData section not finished"},
+      {"<a><![CDATA[x", 1, 14, "CData section not finished"},
+      {"<a><![CDATA[x]]", 1, 16, "CData section not finished"},
       {"<a><!-- -- --></a>", 1, 9, "Double hyphen within comment"},
       {"<a/><b/>", 1, 5, "Extra content at the end of the document"},
       {"<a/>\n\n x", 3, 2, "Extra content at the end of the document"},
@@ -281,7 +284,8 @@ TEST(XMLParser, EveryBeginningOfADocumentEndsInAnError) {
       "<?xml version='1.0'?><!DOCTYPE a [<!ENTITY e '<b>x</b>'><!ATTLIST a d CDATA 'v'>]>"
       "<a x='&e2;' xmlns:p='u'><p:b>t\xC3\xA9&e;<![CDATA[c]]></p:b><!--c--><?p q?></a>";
   for (size_t length = 0; length < text.size(); ++length) {
-    errorOf(std::string_view(text).substr(0, length));
+    const std::string message = errorOf(std::string_view(text).substr(0, length)).message;
+    EXPECT_EQ(message.find("Unregistered"), std::string::npos) << text.substr(0, length);
   }
 }
 
