@@ -7,6 +7,8 @@
 // Operator    a literal
 // Why         all of these look at their operands only, and a value of one item is all they answer;
 //             what fails is left as it was written, since it may never be reached
+// Bound       of what fails each part is tried again. Once that has cost so many times the program,
+//             parts of what failed are left as they are
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/TypeTests/XQueryTypeExprs.h"
@@ -30,16 +32,25 @@ bool isSingleAtom(const Value& value) {
 class Folding {
  public:
   explicit Folding(XQueryPlanning& planning)
-      : _planning(planning), _isConstant(planning.program.placeCount()) {}
+      : _planning(planning),
+        _isConstant(planning.program.placeCount()),
+        _sizes(planning.program.placeCount(), 1),
+        _hasFailed(planning.program.placeCount()),
+        _triesLeft(mostTimes * planning.program.placeCount()) {}
 
   void run() {
     // Diagnostics show each error as it is made, also one that is left for later.
     if (XQueryLogEnabled()) return;
     for (const XQueryPlaceID place : _planning.program.partsFirst()) {
       _isConstant[place] = isConstant(place);
+      const XQueryPlaceID whole = at(place).parent;
+      if (whole != XQueryNoPlace) _sizes[whole] += _sizes[place];
     }
     // Whole ones first, so that what lies inside of them is left alone.
     for (XQueryPlaceID place = 0; place < _planning.program.placeCount(); ++place) {
+      const XQueryPlaceID whole = at(place).parent;
+      const bool isTriedAgain = whole != XQueryNoPlace && _hasFailed[whole];
+      _hasFailed[place] = isTriedAgain;
       const Kind kind = _planning.program[place].expr->kind();
       if (!_isConstant[place] || kind == Kind::Literal || kind == Kind::ExprList ||
           kind == Kind::Args) {
@@ -48,7 +59,10 @@ class Folding {
       if (!_planning.isOpen(place)) continue;
       if (_planning.showsIdentity(place)) {
         _planning.refuse(place, "its value is handed on, and which object it is can be told");
+      } else if (isTriedAgain && _sizes[place] > _triesLeft) {
+        _planning.refuse(place, "too much of what it is part of has failed");
       } else {
+        if (isTriedAgain) _triesLeft -= _sizes[place];
         fold(place);
       }
     }
@@ -108,6 +122,7 @@ class Folding {
     if (!_context) _context = XQueryContext::xqueryContext();
     const Value value = normalised(at(place).expr->evaluateWithContext(*_context));
     if (XQueryHasFailed(value, *_context)) {
+      _hasFailed[place] = true;
       // What ends the compilation ends it; anything else comes up when it is reached.
       _planning.refuse(place, "it fails, which it may do only when it is reached");
       if (_internal(*_context).isFailingForGood()) _internal(*_context).throwFailure();
@@ -121,9 +136,14 @@ class Folding {
     _planning.replace(place, std::move(literal));
   }
 
+  static constexpr size_t mostTimes = 64;
+
   XQueryPlanning& _planning;
   std::vector<bool> _isConstant;
-  Ref<XQueryContext> _context;  // made for the first one
+  std::vector<size_t> _sizes;    // the number of places from each down
+  std::vector<bool> _hasFailed;  // each, or something around it
+  size_t _triesLeft;             // the sum of the sizes of what may be tried again
+  Ref<XQueryContext> _context;   // made for the first one
 };
 
 }  // namespace
