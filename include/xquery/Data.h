@@ -3,6 +3,7 @@
 
 #include "xquery/Object.h"
 
+#include <algorithm>
 #include <string>
 #include <string_view>
 
@@ -18,9 +19,9 @@ class XQUERY_EXPORT NSData : public NSCounted {
 
   size_t length() const { return _bytes.size(); }
   std::string_view bytes() const { return _bytes; }
-  // The bytes from `from`, at most `count` of them.
+  // The bytes from `from`, at most `count` of them; none from behind the end.
   [[nodiscard]] Ref<NSData> subdataWithRange(size_t from, size_t count) const {
-    return dataWithBytes(_bytes.substr(from, count));
+    return dataWithBytes(_bytes.substr(std::min(from, _bytes.size()), count));
   }
   bool isEqualToData(const NSData& other) const { return _bytes == other._bytes; }
 

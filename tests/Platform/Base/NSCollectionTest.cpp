@@ -1,5 +1,6 @@
 #include "Platform/Base/Counting.h"
 #include "xquery/Collection.h"
+#include "xquery/Data.h"
 #include "xquery/Number.h"
 
 #include <gtest/gtest.h>
@@ -27,6 +28,15 @@ TEST(Collection, ArrayKeepsItsElementsAlive) {
   EXPECT_FALSE(NSCounting::hasOneReference(*number));
   array = nullptr;
   EXPECT_TRUE(NSCounting::hasOneReference(*number));
+}
+
+TEST(Collection, PartsOfDataEndWhereTheDataDoes) {
+  const Ref<NSData> data = NSData::dataWithBytes("abc");
+  EXPECT_EQ(data->subdataWithRange(1, 1)->bytes(), "b");
+  EXPECT_EQ(data->subdataWithRange(1, SIZE_MAX)->bytes(), "bc");
+  EXPECT_EQ(data->subdataWithRange(3, 1)->length(), 0U);
+  EXPECT_EQ(data->subdataWithRange(4, 1)->length(), 0U);
+  EXPECT_EQ(data->subdataWithRange(SIZE_MAX, SIZE_MAX)->length(), 0U);
 }
 
 TEST(Collection, NullIsOneObject) {
