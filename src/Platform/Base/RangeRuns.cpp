@@ -137,6 +137,12 @@ void RangeRuns::giveBack(char* begin, char* end) {
   if (begin < end) ::madvise(begin, static_cast<size_t>(end - begin), MADV_DONTNEED);
 }
 
+// Where the system does not take offers, the pages go back at once.
+void RangeRuns::offer(char* begin, char* end) {
+  if (begin >= end) return;
+  if (::madvise(begin, static_cast<size_t>(end - begin), MADV_FREE) != 0) giveBack(begin, end);
+}
+
 void RangeRuns::giveBackIdle() noexcept {
   const std::lock_guard guard(*this);
   releaseIdle();
@@ -341,7 +347,7 @@ void RangeRuns::releaseToSystem(Run* run) {
   char* const from = std::max(roundedDown(begin, largePageBytes),
                               roundedUp(room.begin + sizeof(FreeRun), largePageBytes));
   char* const to = std::min(roundedUp(end, largePageBytes), roundedDown(room.end, largePageBytes));
-  giveBack(from, to);
+  offer(from, to);
 }
 
 void RangeRuns::releaseIdle() {
