@@ -10,9 +10,11 @@
 #include "xquery/Collection.h"
 #include "xquery/Object.h"
 
-#include <array>
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
+#include <memory>
+#include <new>
 #include <vector>
 
 namespace xquery {
@@ -46,6 +48,7 @@ class XQueryFrame : public NSCounted {
 
  protected:
   XQueryFrame() : NSCounted(Kind::Frame) {}
+  ~XQueryFrame() override { std::destroy_n(_near, std::min(_count, nearSlots)); }
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
@@ -59,7 +62,7 @@ class XQueryFrame : public NSCounted {
 
   void append(Value value) {
     if (_count < nearSlots) {
-      _near[_count] = std::move(value);
+      ::new (&_near[_count]) Value(std::move(value));
     } else {
       _far.push_back(std::move(value));
     }
@@ -67,7 +70,10 @@ class XQueryFrame : public NSCounted {
   }
 
   size_t _count = 0;
-  std::array<Value, nearSlots> _near;
+  // Those in use are made as they are set: most calls set two or three.
+  union {
+    Value _near[nearSlots];
+  };
   std::vector<Value> _far;
 };
 

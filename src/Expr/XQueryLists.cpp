@@ -33,6 +33,11 @@ void XQueryExprList::bindInfoForProlog(XQueryProlog& prolog) {
 
 Value XQueryExprList::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
+  if (const XQueryExpr* only = count() == 1 ? objectAtIndex(0) : nullptr) {
+    Value value = only->evaluateWithContext(context);
+    if (value) return normalised(std::move(value));
+    return _internal(context).isFailing() ? Value() : Value(NSNull::null());
+  }
   XQueryGatherer results;
   for (size_t index = 0; index < count(); ++index) {
     Value value = objectAtIndex(index)->evaluateWithContext(context);

@@ -70,12 +70,6 @@ void XQuerySequence::replaceObjectAtIndex(size_t index, const Value& withObject)
   if (index < _objects.size()) _objects[index] = withObject;
 }
 
-Value normalised(Value value) {
-  const auto* array = dyn_cast<NSArray>(value);
-  if (!array || array->count() > 1) return value;
-  return normalisedIn(value);
-}
-
 const Value& normalisedIn(const Value& value) {
   static const Value empty(NSNull::null());
   const auto* array = dyn_cast<NSArray>(value);
@@ -97,7 +91,9 @@ Value flattened(Value value) {
 
 void XQueryGatherer::add(Value value) {
   if (!value || isNull(value)) return;
-  if (_sequence) {
+  if (_sequence && !isa<NSArray>(value)) {
+    _sequence->objects().push_back(std::move(value));
+  } else if (_sequence) {
     _sequence->addObject(std::move(value));
   } else if (_first) {
     _sequence = XQuerySequence::sequenceWithItem(std::exchange(_first, Value()));
@@ -115,6 +111,7 @@ Value XQueryGatherer::value() {
 
 void XQueryItemTally::add(const Value& value) {
   if (!value || isNull(value)) return;
+  if (!isa<NSArray>(value)) return addItems(1);
   if (++_values == 1) _alone = XQueryItemList(normalised(value).get()).count();
   _flat += XQueryItemList(flattened(value).get()).count();
 }

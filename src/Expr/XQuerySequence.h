@@ -39,9 +39,13 @@ inline bool isNull(const Value& value) {
 }
 
 // A one-element array becomes its element and an empty array NSNull; anything else is unchanged.
-Value normalised(Value value);
-// The same for whoever only looks at it: the value itself, or what it has or the process.
+// Here it is answered for whoever only looks at it: the value itself, or what it has or the
+// process.
 const Value& normalisedIn(const Value& value);
+inline Value normalised(Value value) {
+  if (!isa<NSArray>(value) || cast<NSArray>(value)->count() > 1) return value;
+  return normalisedIn(value);
+}
 
 // The value with nothing but items in it: of an array the sequence that adding it to an empty one
 // gives, which is the array itself when it is flat already. Anything else is unchanged.

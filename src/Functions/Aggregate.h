@@ -17,6 +17,8 @@ Value fn_avg(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_max(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_min(const Value* arguments, size_t count, XQueryContext& context);
 
+// The sum of one item or more; null where there is none.
+Value XQuerySumOf(const Value& sequence, XQueryContext& context);
 // The average of so many items, whose sum that is.
 Value XQueryAverageOf(Value sum, size_t items, XQueryContext& context);
 

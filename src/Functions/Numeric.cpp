@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <utility>
 
 namespace xquery {
 namespace {
@@ -36,11 +37,19 @@ bool isExact(XQueryTypeID type) {
 
 // A value of the type, where that holds the number: abs of a negativeInteger is none.
 Value exactOfType(NSDecimal value, XQueryTypeID type, XQueryContext& context) {
+  // Of these two types it is as it stands.
+  if (type == XQueryTypeInteger && value.isInteger()) {
+    return XQueryNumber::integerWithDecimal(std::move(value));
+  }
+  if (type == XQueryTypeDecimal && !value.isNaN()) {
+    return XQueryNumber::numberWithDecimal(std::move(value));
+  }
   return XQueryCastAsTypeForContext(XQueryNumber::numberWithDecimal(std::move(value)), type,
                                     context);
 }
 
 Value floatingOfType(double value, XQueryTypeID type, XQueryContext& context) {
+  if (type == XQueryTypeDouble) return XQueryNumber::numberWithDouble(value);
   return XQueryCastAsTypeForContext(XQueryNumber::numberWithDouble(value), type, context);
 }
 

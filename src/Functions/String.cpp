@@ -6,6 +6,7 @@
 #include "Platform/Text/Blocks.h"
 #include "Types/XQueryAtomization.h"
 #include "Types/XQueryCasting.h"
+#include "Types/XQueryIntegerText.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryString.h"
 #include "Types/XQueryUntypedText.h"
@@ -122,6 +123,11 @@ Value fn_concat(const Value* arguments, size_t count, XQueryContext& context) {
     // The text of a node, too, is that of its value.
     if (XQueryIsNode(argument.get()) || isa<NSString>(argument)) {
       text.append(XQueryUntypedText(*argument).view());
+      continue;
+    }
+    const auto* number = dyn_cast<XQueryNumber>(argument);
+    if (number && XQueryIntegerText::isFor(*number)) {
+      text.append(XQueryIntegerText(*number).view());
       continue;
     }
     const Value item = textToConcat(argument, context);

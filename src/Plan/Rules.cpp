@@ -80,6 +80,9 @@ constexpr std::array rules = {
                XQueryAskEarly},
     XQueryRule{"scalars", "arithmetic, comparisons and logic over numbers make no objects between",
                XQueryComputeScalars},
+    // Behind what it adds without making it.
+    XQueryRule{"folds", "what a loop yields is summed up or compared as it comes, without a list",
+               XQueryFoldNumbers},
 };
 
 }  // namespace

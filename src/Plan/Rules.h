@@ -57,5 +57,6 @@ void XQueryJoinConditions(XQueryPlanning& planning);
 void XQueryLookUpValues(XQueryPlanning& planning);
 void XQueryAskEarly(XQueryPlanning& planning);
 void XQueryComputeScalars(XQueryPlanning& planning);
+void XQueryFoldNumbers(XQueryPlanning& planning);
 
 }  // namespace xquery

@@ -96,6 +96,7 @@ Value XQueryAtomizationCheckingOccurrence(const Value& value, int code, XQueryCo
 // A sequence of several atomic values counts as true: this is lenient on purpose.
 Value XQueryEffectiveBooleanValue(const Value& value, XQueryContext&) {
   const NSObject* item = value.get();
+  if (item == NSNumber::trueValue() || item == NSNumber::falseValue()) return value;
   while (const NSArray* sequence = dyn_cast<NSArray>(item)) {
     if (sequence->count() != 1) return NSNumber::numberWithBool(sequence->count() > 1);
     item = sequence->objects().front().get();

@@ -12,6 +12,7 @@
 #include "Types/XQueryDate.h"
 #include "Types/XQueryDuration.h"
 #include "Types/XQueryErrors.h"
+#include "Types/XQueryIntegerText.h"
 #include "Types/XQueryNotation.h"
 #include "Types/XQueryNumber.h"
 #include "Types/XQueryQName.h"
@@ -173,6 +174,13 @@ Value numberToDouble(const Cast& cast) {
   return doubleNumber(number.doubleValue(), cast.target);
 }
 
+Value numberToStringFamily(const Cast& cast) {
+  if (cast.target != XQueryTypeString || !XQueryIntegerText::isFor(cast.number())) {
+    return toStringFamily(cast);
+  }
+  return XQueryString::stringWithView(XQueryIntegerText(cast.number()).view());
+}
+
 Value booleanToDouble(const Cast& cast) {
   const bool isTrue = cast.object.get() == NSNumber::trueValue();
   return XQueryCastAs(Value(isTrue ? XQueryNumber::one() : XQueryNumber::zero()), cast.target,
@@ -305,7 +313,7 @@ constexpr CastRow castRows[] = {
     {Source::String, XQueryTypeNotation, stringToNotation},
 
     {Source::Number, XQueryTypeUntypedAtomic, toUntypedAtomic},
-    {Source::Number, XQueryTypeString, toStringFamily},
+    {Source::Number, XQueryTypeString, numberToStringFamily},
     {Source::Number, XQueryTypeBoolean, numberToBoolean},
     {Source::Number, XQueryTypeDouble, numberToDouble},
     {Source::Number, XQueryTypeFloat, numberToDouble},

@@ -5,6 +5,7 @@
 #include "Platform/Base/LastingObjects.h"
 #include "Platform/Numbers/NumberText.h"
 #include "Types/DurationReader.h"
+#include "Types/XQueryIntegerText.h"
 #include "xquery/Date.h"
 
 #include <cmath>
@@ -350,6 +351,9 @@ Ref<NSString> XQueryNumber::XQueryStringValue() const {
     case XQueryTypeDayTimeDuration:
       return NSString::stringWithASCII(dayTimeText(doubleValue()));
     default:
+      if (XQueryIntegerText::isFor(*this)) {
+        return NSString::stringWithView(XQueryIntegerText(*this).view());
+      }
       return NSString::stringWithASCII(stringValue());
   }
 }

@@ -1,6 +1,7 @@
 // Typed numbers: every numeric type, and the two ordered durations as counts of months and seconds.
 #pragma once
 
+#include "Platform/Base/Counting.h"
 #include "Platform/Numbers/NSDecimal.h"
 #include "Types/XQueryTypeTable.h"
 
@@ -52,6 +53,15 @@ class XQueryNumber : public NSNumber {
   // Of a given decimal-based type, unchecked: the caller knows that the value fits.
   [[nodiscard]] static Ref<XQueryNumber> integerWithInt64(int64_t value);
   [[nodiscard]] static Ref<XQueryNumber> integerWithDecimal(NSDecimal value);
+  // Makes an integer another one, so that a loop over a range needs no object for each turn; only
+  // where nobody but the caller holds it. False for what is no such integer.
+  bool becomeInteger(int64_t value) {
+    if (typeID() != XQueryTypeInteger || !storedDecimal() || !NSCounting::hasOneReference(*this)) {
+      return false;
+    }
+    *reinterpret_cast<NSDecimal*>(_decimal) = NSDecimal(value);
+    return true;
+  }
 
   [[nodiscard]] static Ref<XQueryNumber> yearMonthDurationWithMonths(int64_t months);
   [[nodiscard]] static Ref<XQueryNumber> dayTimeDurationWithSeconds(double seconds);

@@ -1,9 +1,11 @@
 #include "Expr/Clauses/XQueryClauseItems.h"
 
 #include "Context/XQueryContextInternal.h"
+#include "Expr/Clauses/XQueryItemFold.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Operators/XQueryRange.h"
 #include "Expr/XQueryBinding.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryNumber.h"
 
 namespace xquery {
@@ -54,11 +56,24 @@ void XQueryClauseItems::fetchBehind(size_t index) const {
   }
 }
 
+void XQueryClauseItems::setIntegerAt(size_t index, int64_t varID,
+                                     XQueryContextInternal& context) const {
+  auto* former = dyn_cast<XQueryNumber>(context.variableForID(varID));
+  if (former && former->becomeInteger(integerAt(index))) return;
+  context.setVariable(XQueryNumber::integerWithInt64(integerAt(index)), varID);
+}
+
+void XQueryClauseItems::foldIntegers(XQueryItemFold& fold) const {
+  WorkPacer pacer;
+  for (size_t index = 0; index < _count; ++index) {
+    pacer.turn();
+    fold.addInteger(integerAt(index));
+  }
+}
+
 Value XQueryClauseItems::operator[](size_t index) const {
   if (!_isRange) return _list[index];
-  // Added as unsigned numbers: the last integer may be the greatest there is.
-  return XQueryNumber::integerWithInt64(
-      static_cast<int64_t>(static_cast<uint64_t>(_first) + static_cast<uint64_t>(index)));
+  return XQueryNumber::integerWithInt64(integerAt(index));
 }
 
 }  // namespace xquery

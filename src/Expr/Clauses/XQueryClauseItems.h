@@ -14,6 +14,8 @@
 namespace xquery {
 
 class XQueryContext;
+class XQueryContextInternal;
+class XQueryItemFold;
 class XQueryExpr;
 
 class XQueryClauseItems {
@@ -26,6 +28,13 @@ class XQueryClauseItems {
   // An error has come up instead of the items.
   bool haveFailed() const { return _haveFailed; }
   size_t count() const { return _count; }
+  // Whether they are the integers of a range, of which these are some.
+  bool areIntegers() const { return _isRange; }
+  // Sets a variable to one of these. Where nobody else has kept the integer that it holds, as a
+  // result or in another variable, that becomes the new one.
+  void setIntegerAt(size_t index, int64_t varID, XQueryContextInternal& context) const;
+  // Adds these to a fold.
+  void foldIntegers(XQueryItemFold& fold) const;
   // What the picker of the clause picks of them; false when each has to be asked.
   bool pick(const XQueryPicker* picker, XQueryContext& context, XQueryPicks& picks) const;
   Value operator[](size_t index) const;
@@ -34,6 +43,11 @@ class XQueryClauseItems {
   void fetchBehind(size_t index) const;
 
  private:
+  int64_t integerAt(size_t index) const {
+    // Added as unsigned numbers: the last integer may be the greatest there is.
+    return static_cast<int64_t>(static_cast<uint64_t>(_first) + static_cast<uint64_t>(index));
+  }
+
   Value _value;          // of anything but a range
   XQueryItemList _list;  // over the value
   bool _isRange = false;

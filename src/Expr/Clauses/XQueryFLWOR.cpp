@@ -4,7 +4,9 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Clauses/XQueryClauseItems.h"
 #include "Expr/Clauses/XQueryFLWORSort.h"
+#include "Expr/Clauses/XQueryItemFold.h"
 #include "Expr/XQueryAsking.h"
+#include "Expr/XQueryLists.h"
 #include "Expr/XQueryParts.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryProlog.h"
@@ -20,17 +22,34 @@
 namespace xquery {
 
 // What the tuples have yielded: values, or their number where that is all that is asked for, or
-// items with their keys when there are order specs.
+// what a fold makes of them, or items with their keys when there are order specs.
 struct XQueryFLWORResults {
   XQueryGatherer values;
   std::optional<XQueryItemTally> tally;
+  XQueryItemFold* fold = nullptr;              // takes the values, where there is one
+  const XQueryItemYielder* yielder = nullptr;  // what it asks in place of the return clause
   XQuerySortList sortList;
   uint64_t wanted = UINT64_MAX;  // so many items at most, without order specs
   uint64_t gathered = 0;         // of them
 
+  // Of a tuple, without order specs.
+  void add(Value value) {
+    if (fold) return fold->add(std::move(value));
+    if (tally) return tally->add(value);
+    values.add(std::move(value));
+  }
   bool mayEndEarly() const { return wanted != UINT64_MAX || (tally && tally->mayEndEarly()); }
   bool areComplete() const { return gathered >= wanted || (tally && tally->isComplete()); }
 };
+
+namespace {
+
+// `position` counts from 0.
+void setPosition(size_t position, int64_t varID, XQueryContextInternal& context) {
+  context.setVariable(NSNumber::numberWithLongLong(static_cast<int64_t>(position) + 1), varID);
+}
+
+}  // namespace
 
 // --- clauses -------------------------------------------------------------------------------------
 
@@ -177,6 +196,9 @@ bool XQueryFLWORExpr::evaluateFor(const XQueryForExpr& clause, size_t index,
   if (items.pick(clause.picker(), withContext, picks)) {
     return evaluatePicks(clause, index, picks, toResults, withContext);
   }
+  if (items.areIntegers() && !clause.type()) {
+    return evaluateRange(clause, index, items, toResults, withContext);
+  }
   items.flatten();
   for (size_t k = 0; k < items.count(); ++k) {
     items.fetchBehind(k);
@@ -192,9 +214,30 @@ bool XQueryFLWORExpr::evaluateItem(const XQueryForExpr& clause, size_t index, Va
   checkWork();
   if (!isOfType(clause, item.get(), withContext)) return false;
   setTuple(clause, std::move(item), position, withContext);
+  return evaluateBehind(clause, index, toResults, withContext);
+}
+
+// The variables of the clause are set.
+bool XQueryFLWORExpr::evaluateBehind(const XQueryForExpr& clause, size_t index,
+                                     XQueryFLWORResults& toResults,
+                                     XQueryContext& withContext) const {
   if (dropsTuple(clause, withContext)) return !_internal(withContext).isFailing();
   return index + 1 == _forLet.size() ? processItem(toResults, withContext)
                                      : evaluateStartingAt(index + 1, toResults, withContext);
+}
+
+// Over the integers of a range.
+bool XQueryFLWORExpr::evaluateRange(const XQueryForExpr& clause, size_t index,
+                                    const XQueryClauseItems& items, XQueryFLWORResults& toResults,
+                                    XQueryContext& withContext) const {
+  auto& dynamic = _internal(withContext);
+  for (size_t k = 0; k < items.count(); ++k) {
+    checkWork();
+    items.setIntegerAt(k, clause.varID(), dynamic);
+    if (clause.posVarID()) setPosition(k, clause.posVarID(), dynamic);
+    if (!evaluateBehind(clause, index, toResults, withContext)) return false;
+  }
+  return true;
 }
 
 // The same as for a list of the items, of which those behind the last wanted one are not found.
@@ -233,9 +276,7 @@ void XQueryFLWORExpr::setTuple(const XQueryForExpr& clause, Value item, size_t p
                                XQueryContext& context) {
   auto& dynamic = _internal(context);
   dynamic.setVariable(std::move(item), clause.varID());
-  if (!clause.posVarID()) return;
-  dynamic.setVariable(NSNumber::numberWithLongLong(static_cast<int64_t>(position) + 1),
-                      clause.posVarID());
+  if (clause.posVarID()) setPosition(position, clause.posVarID(), dynamic);
 }
 
 bool XQueryFLWORExpr::evaluatePicks(const XQueryForExpr& clause, size_t index,
@@ -285,8 +326,13 @@ bool XQueryFLWORExpr::addPicks(uint64_t number, XQueryFLWORResults& toResults,
     return addTuple(_sureReturn ? _sureReturn.get() : _returnExpr.get(), toResults, withContext);
   }
   const auto sum = static_cast<int64_t>(number) * *_yield.summand;
-  toResults.values.add(XQueryNumber::integerWithInt64(sum));
-  toResults.values.add(XQueryNumber::integerWithInt64(0));
+  for (const int64_t part : {sum, int64_t{0}}) {
+    if (toResults.fold) {
+      toResults.fold->addInteger(part);
+    } else {
+      toResults.values.add(XQueryNumber::integerWithInt64(part));
+    }
+  }
   return true;
 }
 
@@ -302,18 +348,33 @@ bool XQueryFLWORExpr::processItem(XQueryFLWORResults& toResults, XQueryContext& 
 
 bool XQueryFLWORExpr::addTuple(const XQueryExpr* returned, XQueryFLWORResults& toResults,
                                XQueryContext& withContext) const {
+  if (toResults.yielder && returned == _returnExpr.get()) {
+    return toResults.yielder->yieldTo(*toResults.fold, withContext);
+  }
+  const auto* list = dyn_cast<XQueryExprList>(returned);
+  if (list && list->count() > 1 && _orderSpecs.empty() && !toResults.mayEndEarly()) {
+    return addList(*list, toResults, withContext);
+  }
   Value value = XQueryEvaluateOrEmpty(returned, withContext);
   if (XQueryHasFailed(value, withContext)) return false;
   if (!_orderSpecs.empty()) {
     return addSortItems(std::move(value), toResults.sortList, withContext);
   }
-  if (toResults.tally) {
-    toResults.tally->add(value);
-    return !toResults.areComplete();
-  }
   if (toResults.wanted != UINT64_MAX) toResults.gathered += XQueryItemList(value.get()).count();
-  toResults.values.add(std::move(value));
+  toResults.add(std::move(value));
   return !toResults.areComplete();
+}
+
+// What stands between commas is added one after the other, without a list for each tuple.
+bool XQueryFLWORExpr::addList(const XQueryExprList& list, XQueryFLWORResults& toResults,
+                              XQueryContext& withContext) const {
+  XQueryCheckStack(withContext);
+  for (size_t index = 0; index < list.count(); ++index) {
+    Value value = list.objectAtIndex(index)->evaluateWithContext(withContext);
+    if (XQueryHasFailed(value, withContext)) return false;
+    toResults.add(std::move(value));
+  }
+  return true;
 }
 
 // Adds every item of the value with the keys of the tuple.
@@ -349,6 +410,14 @@ std::optional<uint64_t> XQueryFLWORExpr::countItems(uint64_t most, XQueryContext
   results.tally.emplace(most);
   if (!evaluateStartingAt(0, results, context) && !results.areComplete()) return std::nullopt;
   return std::min(results.tally->count(), most);
+}
+
+bool XQueryFLWORExpr::foldItems(XQueryItemFold& fold, XQueryContext& context) const {
+  XQueryFLWORResults results;
+  results.fold = &fold;
+  // A profile counts what stands in the return clause.
+  if (!_internal(context).profile()) results.yielder = _yielder;
+  return evaluateStartingAt(0, results, context);
 }
 
 Value XQueryFLWORExpr::computeValue(XQueryContext& context) const {

@@ -12,6 +12,10 @@
 
 namespace xquery {
 
+class XQueryClauseItems;
+class XQueryExprList;
+class XQueryItemFold;
+class XQueryItemYielder;
 struct XQueryFLWORResults;
 struct XQuerySortList;
 
@@ -130,6 +134,14 @@ class XQueryFLWORExpr : public XQueryExpr {
   // How many items the value has, or `most` where there are more, having looked no further than
   // that takes. None after an error. For one without order specs.
   std::optional<uint64_t> countItems(uint64_t most, XQueryContext& context) const;
+  // Adds what its value consists of to the fold, in order; false after an error. For one without
+  // order specs.
+  bool foldItems(XQueryItemFold& fold, XQueryContext& context) const;
+  // What the return clause is for a fold: what stands there, or in parentheses there.
+  void setYielder(Ref<XQueryExpr> expr, const XQueryItemYielder* yielder) {
+    _yieldingExpr = std::move(expr);
+    _yielder = yielder;
+  }
   // Its value, of which only the first so many items are wanted: others may be left out.
   Value firstItems(uint64_t most, XQueryContext& context) const;
   void visitParts(XQueryPartVisitor& visitor) override;
@@ -146,6 +158,10 @@ class XQueryFLWORExpr : public XQueryExpr {
                           XQueryContext& withContext) const;
   bool evaluateFor(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
                    XQueryContext& withContext) const;
+  bool evaluateRange(const XQueryForExpr& clause, size_t index, const XQueryClauseItems& items,
+                     XQueryFLWORResults& toResults, XQueryContext& withContext) const;
+  bool evaluateBehind(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
+                      XQueryContext& withContext) const;
   bool evaluateGiven(const XQueryForExpr& clause, size_t index, XQueryFLWORResults& toResults,
                      XQueryContext& withContext) const;
   bool evaluateItem(const XQueryForExpr& clause, size_t index, Value item, size_t position,
@@ -153,6 +169,8 @@ class XQueryFLWORExpr : public XQueryExpr {
   bool processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const;
   bool addTuple(const XQueryExpr* returned, XQueryFLWORResults& toResults,
                 XQueryContext& withContext) const;
+  bool addList(const XQueryExprList& list, XQueryFLWORResults& toResults,
+               XQueryContext& withContext) const;
   bool addSortItems(Value value, XQuerySortList& toList, XQueryContext& context) const;
   bool isOfType(const XQueryBindingExpr& clause, const NSObject* value,
                 XQueryContext& context) const;
@@ -172,6 +190,8 @@ class XQueryFLWORExpr : public XQueryExpr {
   Ref<XQueryExpr> _sureReturn;
   Ref<XQueryExpr> _otherReturn;
   Yield _yield;
+  Ref<XQueryExpr> _yieldingExpr;  // keeps the yielder
+  const XQueryItemYielder* _yielder = nullptr;
 };
 
 // "ordered {...}" and "unordered {...}": the ordering mode for the extent of the operand.

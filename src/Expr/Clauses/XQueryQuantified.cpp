@@ -86,8 +86,14 @@ Value XQueryQuantifiedExpr::evaluateItems(size_t clause, size_t index,
   }
   const Value open = undecided();
   Value answer;
+  const bool areIntegers = items.areIntegers() && !binding.type();
   for (size_t i = 0; i < items.count(); ++i) {
-    answer = evaluateItem(clause, index, items[i], context);
+    if (areIntegers) {
+      items.setIntegerAt(i, binding.varID(), _internal(context));
+      answer = evaluatePostion(index + 1, context);
+    } else {
+      answer = evaluateItem(clause, index, items[i], context);
+    }
     if (answer != open) break;
   }
   return answer;

@@ -12,6 +12,7 @@
 
 namespace xquery {
 
+class XQueryItemYielder;
 class XQueryNodeQuestion;
 class XQueryWalkedPath;
 
@@ -24,6 +25,8 @@ class XQueryPlannedExpr : public XQueryExpr {
   virtual const XQueryWalkedPath* walkedPath() const { return nullptr; }
   // What it is as a condition on its context item; null where that takes evaluating it.
   virtual const XQueryNodeQuestion* nodeQuestion() const { return nullptr; }
+  // Itself, where it can be added to a fold without being made; null for most.
+  virtual const XQueryItemYielder* itemYielder() const { return nullptr; }
   // What it stands for has been bound.
   void bindInfoForProlog(XQueryProlog&) override {}
   void visitParts(XQueryPartVisitor& visitor) override {

@@ -93,60 +93,37 @@ Scalar placeInFocus(int64_t number) {
 
 }  // namespace
 
-XQueryScalar XQueryScalar::ofInteger(int64_t value) {
-  XQueryScalar scalar;
-  scalar.form = Integer;
-  scalar.integer = value;
-  return scalar;
-}
-
-XQueryScalar XQueryScalar::ofDouble(double value) {
-  XQueryScalar scalar;
-  scalar.form = Double;
-  scalar.number = value;
-  return scalar;
-}
-
-XQueryScalar XQueryScalar::ofTruth(bool value) {
-  XQueryScalar scalar;
-  scalar.form = Truth;
-  scalar.truth = value;
-  return scalar;
-}
-
-XQueryScalar XQueryScalar::ofObject(const NSObject* value) {
-  XQueryScalar scalar;
-  if (value) {
-    scalar.form = Object;
-    scalar.object = value;
-  }
-  return scalar;
-}
-
 XQueryScalar XQueryScalarSteps::answer(const XQueryContext& context) const {
-  const Scalar last = valueOf(static_cast<Index>(_steps.size() - 1), context);
+  const Scalar last = valueOf(static_cast<Index>(_steps.size() - 1), _internal(context));
   return last.form == Form::Object ? Scalar() : last;
 }
 
-XQueryScalar XQueryScalarSteps::valueOf(Index index, const XQueryContext& context) const {
+// Most operands are at hand: they are taken in place.
+[[gnu::always_inline]] inline XQueryScalar XQueryScalarSteps::operand(
+    Index index, const XQueryContextInternal& context) const {
   const Step& step = _steps[index];
-  const auto& dynamic = _internal(context);
+  if (step.kind == Kind::Constant) return step.constant;
+  if (step.kind == Kind::Variable) return Scalar::ofObject(context.variableForID(step.varID));
+  return valueOf(index, context);
+}
+
+XQueryScalar XQueryScalarSteps::valueOf(Index index, const XQueryContextInternal& context) const {
+  const Step& step = _steps[index];
   switch (step.kind) {
     case Kind::Constant:
-      return step.constant;
     case Kind::Variable:
-      return Scalar::ofObject(dynamic.variableForID(step.varID));
+      return operand(index, context);
     case Kind::ContextItem:
-      return Scalar::ofObject(dynamic.contextItem().get());
+      return Scalar::ofObject(context.contextItem().get());
     case Kind::Position:
-      return placeInFocus(dynamic.position());
+      return placeInFocus(context.position());
     case Kind::Last:
-      return placeInFocus(dynamic.last());
+      return placeInFocus(context.last());
     case Kind::Arithmetic:
     case Kind::Comparison: {
-      const Scalar left = valueOf(step.left, context);
+      const Scalar left = operand(step.left, context);
       if (left.form == Form::Unknown) return left;
-      const Scalar right = valueOf(step.right, context);
+      const Scalar right = operand(step.right, context);
       return step.kind == Kind::Arithmetic ? arithmetic(step.code, left, right)
                                            : comparison(step.code, left, right);
     }
@@ -159,10 +136,11 @@ XQueryScalar XQueryScalarSteps::valueOf(Index index, const XQueryContext& contex
 }
 
 // The operand behind one that decides is not looked at.
-XQueryScalar XQueryScalarSteps::logic(const Step& step, const XQueryContext& context) const {
+XQueryScalar XQueryScalarSteps::logic(const Step& step,
+                                      const XQueryContextInternal& context) const {
   if (step.kind == Kind::Not) {
-    const Scalar operand = truthOf(valueOf(step.right, context));
-    return operand.form == Form::Unknown ? operand : Scalar::ofTruth(!operand.truth);
+    const Scalar only = truthOf(valueOf(step.right, context));
+    return only.form == Form::Unknown ? only : Scalar::ofTruth(!only.truth);
   }
   const Scalar left = truthOf(valueOf(step.left, context));
   if (left.form == Form::Unknown || left.truth == (step.kind == Kind::Or)) return left;
@@ -181,6 +159,23 @@ Value XQueryScalarExpr::computeValue(XQueryContext& context) const {
     default:
       return plain().evaluateWithContext(context);
   }
+}
+
+bool XQueryScalarExpr::yieldTo(XQueryItemFold& fold, XQueryContext& context) const {
+  const Scalar answer = _steps.answer(context);
+  if (answer.form == Form::Integer) {
+    fold.addInteger(answer.integer);
+    return true;
+  }
+  if (answer.form == Form::Double) {
+    fold.addDouble(answer.number);
+    return true;
+  }
+  Value value = answer.form == Form::Truth ? Value(NSNumber::numberWithBool(answer.truth))
+                                           : plain().evaluateWithContext(context);
+  if (XQueryHasFailed(value, context)) return false;
+  fold.add(std::move(value));
+  return true;
 }
 
 }  // namespace xquery

@@ -9,6 +9,7 @@
 // looked at until then can be told.
 #pragma once
 
+#include "Expr/Clauses/XQueryItemFold.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
 
 #include <cstddef>
@@ -17,6 +18,8 @@
 #include <vector>
 
 namespace xquery {
+
+class XQueryContextInternal;
 
 // A number, a truth value, or an object that has not been looked at. Unknown: it takes evaluating
 // the expression to tell.
@@ -31,10 +34,32 @@ struct XQueryScalar {
     const NSObject* object;  // kept alive by whom it was taken from
   };
 
-  static XQueryScalar ofInteger(int64_t value);
-  static XQueryScalar ofDouble(double value);
-  static XQueryScalar ofTruth(bool value);
-  static XQueryScalar ofObject(const NSObject* value);
+  static XQueryScalar ofInteger(int64_t value) {
+    XQueryScalar scalar;
+    scalar.form = Integer;
+    scalar.integer = value;
+    return scalar;
+  }
+  static XQueryScalar ofDouble(double value) {
+    XQueryScalar scalar;
+    scalar.form = Double;
+    scalar.number = value;
+    return scalar;
+  }
+  static XQueryScalar ofTruth(bool value) {
+    XQueryScalar scalar;
+    scalar.form = Truth;
+    scalar.truth = value;
+    return scalar;
+  }
+  // Unknown where there is none.
+  static XQueryScalar ofObject(const NSObject* value) {
+    XQueryScalar scalar;
+    if (!value) return scalar;
+    scalar.form = Object;
+    scalar.object = value;
+    return scalar;
+  }
 };
 
 // The steps of such a computation. Operands stand before what they are operands of.
@@ -77,13 +102,14 @@ class XQueryScalarSteps {
   XQueryScalar answer(const XQueryContext& context) const;
 
  private:
-  XQueryScalar valueOf(Index index, const XQueryContext& context) const;
-  XQueryScalar logic(const Step& step, const XQueryContext& context) const;
+  XQueryScalar valueOf(Index index, const XQueryContextInternal& context) const;
+  XQueryScalar operand(Index index, const XQueryContextInternal& context) const;
+  XQueryScalar logic(const Step& step, const XQueryContextInternal& context) const;
 
   std::vector<Step> _steps;
 };
 
-class XQueryScalarExpr : public XQueryPlannedExpr {
+class XQueryScalarExpr : public XQueryPlannedExpr, public XQueryItemYielder {
  public:
   [[nodiscard]] static Ref<XQueryScalarExpr> exprWithPlain(Ref<XQueryExpr> plain,
                                                            XQueryScalarSteps steps) {
@@ -91,6 +117,8 @@ class XQueryScalarExpr : public XQueryPlannedExpr {
   }
 
   Value computeValue(XQueryContext& context) const override;
+  const XQueryItemYielder* itemYielder() const override { return this; }
+  bool yieldTo(XQueryItemFold& fold, XQueryContext& context) const override;
 
  protected:
   XQueryScalarExpr(Ref<XQueryExpr> plain, XQueryScalarSteps steps)

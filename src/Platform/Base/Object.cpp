@@ -432,6 +432,11 @@ void NSCounted::operator delete(void* block, size_t size) noexcept {
 }
 
 void NSCounted::destroy(const NSCounted* object) {
+  // A number refers to no other object, so that nothing nests and nothing is worth setting aside.
+  if (object->kind() >= Kind::Number && object->kind() <= Kind::TypedNumber) {
+    delete object;
+    return;
+  }
   // A nested destruction takes a few hundred bytes of stack, so this depth is safe everywhere.
   constexpr uint32_t maximumDepth = 64;
   ThreadState& state = threadState;

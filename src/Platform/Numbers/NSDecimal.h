@@ -12,6 +12,7 @@
 #include "xquery/Number.h"
 
 #include <cstdint>
+#include <limits>
 #include <string>
 #include <utility>
 
@@ -97,6 +98,10 @@ class NSDecimal {
   // Whether the value is an integer within int64; the fast paths ask this.
   bool isSmallInteger() const { return _state == Small && _scale == 0; }
   int64_t smallInteger() const { return _coefficient; }
+  // Whether it has so few digits that adding it to another one of these cannot take too many.
+  bool isShort() const {
+    return _state == Small && _scale <= std::numeric_limits<int64_t>::digits10;
+  }
 
   // Plain digits: no exponent, no trailing fractional zeros.
   std::string toString() const;
