@@ -90,10 +90,14 @@ Value itemFromBack(const Value& items, uint64_t behind) {
   return kept.value();
 }
 
-// As a predicate keeps them that answers the same for all; null when a limit was reached.
+// As a predicate keeps them that answers the same for all, leaving the focus that asking each
+// leaves; null when a limit was reached.
 Value itemsChosenAtOnce(const Value& items, const XQueryExpr& predicate, XQueryContext& context) {
   const XQueryItemList list(items.get());
   if (list.count() == 0) return items;
+  const auto count = static_cast<int64_t>(list.count());
+  _internal(context).setContextItem(list[list.count() - 1], count);
+  _internal(context).setLast(count);
   const auto position = XQueryStep::positionIn(predicate, context);
   if (_internal(context).isFailing()) return {};
   XQueryGatherer kept;

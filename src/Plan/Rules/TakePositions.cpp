@@ -5,7 +5,8 @@
 //             $l[position() = last()]
 // Facts       the number is an integer, 1 or more, or an expression that may answer numbers, reads
 //             no focus and is repeatable; nothing shows the focus that the predicate leaves
-//             (StepsAround.h)
+//             (StepsAround.h), but for what is asked of the items that a path starts from, which
+//             leaves the one that asking each leaves
 // Operator    none: the predicate is the number, so that the step walks no further than that; an
 //             expression is evaluated once for the items of the step and not for each of them; what
 //             is counted from the back is taken from there, and children are walked from the last
@@ -47,7 +48,7 @@ class Search {
     const bool hidesFocus = XQueryHidesFocusOf(*here.step, *path, here.parent, _planning);
     if ((isAll || hidesFocus) && takeFromBack(place, *path)) return;
     if (hidesFocus && takeNumber(place, *path)) return;
-    if (isAll || hidesFocus) takeExpression(place, *path);
+    if (path->start() == here.step || hidesFocus) takeExpression(place, *path);
   }
 
  private:
