@@ -81,6 +81,28 @@ TEST(JoinChanges, ADeclarationReplacesAGlobalThatFunctionsHaveRead) {
   }
 }
 
+// --- trees that are moved ------------------------------------------------------------------------
+
+// What a loop joins over is taken into another element in one of its turns, which moves it.
+TEST(JoinChanges, ATreeIsMovedWhileALoopJoinsOverItsNodes) {
+  const std::string tree =
+      "let $t := <r>{for $i in 1 to 400 return <e k='{$i mod 50}'><v>{$i}</v></e>}</r> ";
+  const std::string wrapped = "<wrap>{for $j in 1 to 700 return <p/>}{$t}</wrap>";
+  const std::string wrapping = "let $w := if ($x = 30) then " + wrapped + " else () return ";
+  for (const std::string& query :
+       {tree + "let $l := $t/e return string-join(for $x in 1 to 60 " + wrapping +
+            "string(count(for $e in $l where $e/@k = string($x) return $e)), ' ')",
+        tree + "let $ids := $t/e/@k return string-join(for $x in 1 to 60 " + wrapping +
+            "string((string($x), '99') = $ids), ' ')",
+        tree +
+            "let $l := $t/e for $x in 1 to 60 return (string-join(for $e in $l "
+            "where $e/@k = string($x) return string($e/v), ','), "
+            "if ($x = 20) then count(" +
+            wrapped + "//e) else ())"}) {
+    EXPECT_EQ(answer(query), plainAnswer(query)) << query;
+  }
+}
+
 // --- whatever a query may do ---------------------------------------------------------------------
 
 class Growth : public RandomChoices {

@@ -39,6 +39,10 @@ XQueryJoinRelation relationOf(int type, bool setIsLeft) {
   return by;
 }
 
+bool isEquality(const XQueryRelation& relation) {
+  return relation.test == XQueryRelation::Equal && !relation.negated;
+}
+
 }  // namespace
 
 // Of one side: what the index of the items' tree knows of them, or else, of texts that are asked
@@ -50,7 +54,7 @@ class XQuerySetComparison::Set final : public XQueryKeptValue {
 
   // False where the index has no answer.
   bool takeIndex(XQueryContext& context) {
-    if (!isOfEquality()) return false;
+    if (!isEquality(_by.relation)) return false;
     if (const Items& items = listed()) {
       _indexed = XQueryIndexedItems::of(items, XQueryValueWay(), context);
     }
@@ -58,7 +62,7 @@ class XQuerySetComparison::Set final : public XQueryKeptValue {
   }
   // For: no index, and the items are read from now on.
   void takeTexts() {
-    if (!isOfEquality()) return;
+    if (!isEquality(_by.relation)) return;
     if (const Items& items = listed()) XQueryIndexedItems::noteAsked(*items, XQueryValueWay());
     _texts = XQueryGrowingTexts::of(_items);
   }
@@ -79,10 +83,6 @@ class XQuerySetComparison::Set final : public XQueryKeptValue {
 
  private:
   using Items = XQueryJoinTable::Items;
-
-  bool isOfEquality() const {
-    return _by.relation.test == XQueryRelation::Equal && !_by.relation.negated;
-  }
 
   void leaveIndex() {
     _indexed = nullptr;
