@@ -85,6 +85,8 @@ bool XQueryOperatorMayFail(int type, const XQueryFacts& left, const XQueryFacts&
       return left.most > 1 || right.most > 1 || !canBeCompared(left, right, false);
     case 6:  // general comparison
       return !canBeCompared(left, right, true);
+    case 7:  // node comparison
+      return left.most > 1 || right.most > 1 || !left.are(Node) || !right.are(Node);
     default:
       return true;
   }

@@ -115,6 +115,11 @@ TEST(Facts, OfComparisons) {
       {"$e/@a eq 1", true},
       {"'u' eq 1", true},
       {"true() eq false()", true},
+      {"$e is $e/@a", false},
+      {"$e/@a << $e/@b", false},
+      {"$e >> ()", false},
+      {"$e is $e/b", true},
+      {"$e << 1", true},
   });
   for (const Compared& each : table) {
     const auto query = compiled("let $e := <e/> return " + std::string(each.condition));
