@@ -409,6 +409,7 @@ TEST(TakePositions, TakesNumbersThatAreTheSameForAllNodes) {
                            "count(//a/b[$n + 1])",
                            "exists(//b[$n + 0])",
                            "(//b)[$n + 1]",
+                           "(//b, 1)[$n]/@y",
                            "(//b, 1)/a[$n + 1]",
                            "//a/b[@y][$n + 1]",
                            "(1, 'x', //a)[$n]",

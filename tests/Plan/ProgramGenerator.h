@@ -85,6 +85,8 @@ class ProgramGenerator {
   std::string keyOf(const std::string& item);
   std::string match(const std::string& item);
   std::string matches(const std::string& item);
+  // The same in other words, perhaps with another condition.
+  std::string phrased(const std::string& item);
   // An equality and something else of the same items, both with one key for most of them.
   std::string twoMatches(const std::string& item);
   std::string joined(int depth);

@@ -46,11 +46,25 @@ std::string ProgramGenerator::match(const std::string& item) {
 
 std::string ProgramGenerator::matches(const std::string& item) {
   if (_random.below(6) == 0) return twoMatches(item);
-  std::string text = match(item);
+  std::string text = _random.below(3) ? match(item) : phrased(item);
   while (_random.below(3) == 0) {
     text += " and " + (_random.below(3) ? match(item) : match(variable()));
   }
   return text;
+}
+
+std::string ProgramGenerator::phrased(const std::string& item) {
+  const std::string one = match(item);
+  const std::string other = _random.below(3) ? match(item) : match(variable());
+  return _random.oneOf({"(" + one + " or " + other + ")", "(" + one + " or " + other + ")",
+                        "boolean(" + one + ")", "not(" + one + ")", "not(not(" + one + "))",
+                        "not(" + one + " and " + other + ")",
+                        "not(not(" + one + ") or " + other + ")", "((" + one + ") = true())",
+                        "(false() eq (" + one + "))", "(if (" + one + ") then true() else false())",
+                        "(if (" + one + ") then " + other + " else ())",
+                        "(if (" + one + ") then () else " + other + ")",
+                        "(if (" + one + ") then true() else " + other + ")",
+                        "(if (" + one + ") then " + other + " else true())"});
 }
 
 std::string ProgramGenerator::twoMatches(const std::string& item) {
@@ -101,6 +115,10 @@ std::string ProgramGenerator::joined(int depth) {
                                      "for $v in " + many(), "for $v at $n in " + many(),
                                      "for $v in " + many() + "[" + match(".") + "]",
                                      "for $v in //b[" + match(".") + "]"});
+                  if (_random.below(8) == 0) {
+                    return "let $v := " + match("$u") + " where " + _random.oneOf({"", "not"}) +
+                           "($v)" + _random.oneOf({"", " and " + match("$u")}) + " return $u";
+                  }
                   return clause + within("$v", [&] {
                            std::string rest = " where " + matches(_random.oneOf({"$u", "$v"}));
                            return rest + " return " + (_random.below(2) ? "$v" : expr(depth - 1));
@@ -114,6 +132,7 @@ std::string ProgramGenerator::conditional(int depth) {
   const std::string clause = "for $u in " + many() + " ";
   return within("$u", [&] {
     const std::string condition = "return if (" + matches("$u") + ") then ";
+    if (_random.below(5) == 0) return "(" + clause + condition + "() else " + expr(depth - 1) + ")";
     const std::string value = _random.oneOf({"1", "$u", "2.5", "$u/@x", "-0e0", "'u'"});
     return isSum ? "(sum(" + clause + condition + value + " else 0))"
                  : "(" + clause + condition + expr(depth - 1) + " else ())";

@@ -4,6 +4,7 @@
 #include "Expr/Clauses/XQueryQuantified.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Plan/Joins/XQueryJoin.h"
+#include "Plan/Joins/XQueryJoinOfSeveral.h"
 #include "Plan/Joins/XQueryProbesAhead.h"
 
 #include <memory>
@@ -228,7 +229,9 @@ bool XQueryClauseJoins::joinClause(size_t index) {
   XQueryJoinCondition condition = _picks == Picks::WhereItHolds
                                       ? search.conditionIn(_condition, false)
                                       : search.complementIn(_condition);
-  if (_picks == Picks::WhereItHolds) addTermsAhead(index, scope, search, condition);
+  if (_picks == Picks::WhereItHolds && condition.orElse.empty()) {
+    addTermsAhead(index, scope, search, condition);
+  }
   if (condition.terms.empty()) return false;
   later.leftovers.add(condition.assigns);
   if (later.obstacle.empty() && _planning.showsLeftovers(later.leftovers, _condition)) {
@@ -238,11 +241,11 @@ bool XQueryClauseJoins::joinClause(size_t index) {
     _planning.refuse(_clauses[index], later.obstacle);
     return false;
   }
-  condition.isWhole = condition.isWhole && index + 1 == _clauses.size();
-  condition.needed.insert(condition.needed.end(), later.needed.begin(), later.needed.end());
+  if (index + 1 < _clauses.size()) condition.leaveOpen();
+  condition.addNeeded(later.needed);
   _planning.choose(_clauses[index]);
   auto* joined = cast<XQueryBindingExpr>(at(_clauses[index]).expr);
-  joined->setPicker(XQueryJoin::ofClause(clause, clause.varID(), std::move(condition)));
+  joined->setPicker(XQueryJoinsOfClause(clause, clause.varID(), std::move(condition)));
   return true;
 }
 

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "Expr/XQueryExpr.h"
+#include "Plan/Joins/XQueryConditionParts.h"
 #include "Plan/Joins/XQueryJoinKeys.h"
 #include "Plan/Joins/XQueryJoinTable.h"
 #include "Plan/Paths/XQueryValueWay.h"
@@ -72,9 +73,16 @@ struct XQueryJoinCondition {
   std::vector<XQueryFacts> outward;
   // Local variables that evaluating any of this sets.
   XQueryVariableSet assigns;
+  // Where the condition is that one of several holds: the others, in their order behind this one,
+  // which have none of their own. None is asked behind one that holds.
+  std::vector<XQueryJoinCondition> orElse;
 
   // Another condition holds as well, and an error in either excludes an item.
   void join(XQueryJoinCondition other);
+  // There is more to the condition.
+  void leaveOpen();
+  // What is evaluated for no item that is left out must not fail either.
+  void addNeeded(const std::vector<Ref<XQueryExpr>>& more);
   void putBestFirst();
 };
 
@@ -100,11 +108,22 @@ class XQueryJoinSearch {
   bool cannotFail(XQueryPlaceID place) const;
 
  private:
-  struct Comparison;
+  struct Comparison {
+    XQueryJoinRelation relation;
+    Ref<XQueryExpr> key;  // null for none
+    Ref<XQueryExpr> probe;
+    XQueryFacts keyFacts;
+    XQueryFacts probeFacts;
+    XQueryPlaceID keyPlace = XQueryNoPlace;  // where the key is written, if it is
+    bool isWhole = true;
+  };
+  // The value comparison code whose relation an operator asks for.
+  static std::optional<int> relationCode(int operatorType);
 
   const XQueryPlace& at(XQueryPlaceID place) const { return _planning.program[place]; }
   const XQueryFacts& facts(XQueryPlaceID place) const { return _planning.facts[place]; }
-  Comparison comparisonAt(XQueryPlaceID place) const;
+  Comparison comparisonAt(const XQueryConditionPart& part) const;
+  Comparison comparisonThatFails(XQueryPlaceID place) const;
   struct Operand {
     Ref<XQueryExpr> expr;
     XQueryFacts facts;
@@ -121,8 +140,14 @@ class XQueryJoinSearch {
   Comparison comparisonOfSome(XQueryPlaceID place) const;
   struct Before;
   XQueryJoinScope ofItemOnly() const;
-  XQueryJoinCondition termsIn(XQueryPlaceID place, bool errorExcludes, bool takesConstants) const;
-  bool pass(XQueryPlaceID place, Before& before) const;
+  XQueryJoinCondition conditionOf(const XQueryConditionPart& whole, bool errorExcludes) const;
+  XQueryJoinCondition conditionOf(const XQueryConditionParts& parts, bool errorExcludes) const;
+  XQueryJoinCondition alternativesIn(const XQueryConditionParts& parts, bool errorExcludes) const;
+  XQueryJoinCondition alternativesOf(const XQueryConditionParts& parts, size_t index,
+                                     bool errorExcludes) const;
+  XQueryJoinCondition termsIn(const XQueryConditionParts& parts, bool errorExcludes,
+                              bool takesConstants) const;
+  bool pass(const XQueryConditionPart& part, Before& before) const;
   bool passTerm(XQueryPlaceID place, const Comparison& comparison, XQueryJoinCondition& condition,
                 Before& before) const;
   bool passComparison(XQueryPlaceID place, const XQueryJoinScope& scope, Before& before) const;

@@ -42,6 +42,7 @@ bool isProbe(const XQueryFacts& facts, const XQueryVariableSet& own) {
 
 void XQueryAddTermsBehind(const XQueryPlanning& planning, XQueryPlaceID path,
                           XQueryJoinCondition& condition) {
+  if (!condition.orElse.empty()) return;
   const XQueryProgram& program = planning.program;
   const XQueryPlaceID clause = clauseAround(planning, path);
   const XQueryPlaceID where = clause == XQueryNoPlace ? clause : program.nextPart(clause);

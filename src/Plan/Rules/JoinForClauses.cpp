@@ -2,10 +2,11 @@
 //
 // Pattern     for $x in X ... where ... K = P ...; for $x in X ... return if (... K = P ...) then T
 //             else (); sum(for $x in X ... return if (... K = P ...) then T else 0); also <, <=, >,
-//             >=, the value comparisons, "is", on either side, and starts-with(K, P), among
-//             conditions that "and" joins; K follows from $x, directly, through let and for clauses
-//             behind it, or as "some $y in K satisfies $y = P"; P does not read $x, nor what later
-//             clauses set
+//             >=, the value comparisons, "is", on either side, not(K != P), and starts-with(K, P),
+//             among conditions that "and" joins, one of which may be several joined by "or",
+//             however these are written (XQueryConditionParts); K follows from $x, directly,
+//             through let and for clauses behind it, or as "some $y in K satisfies $y = P"; P does
+//             not read $x, nor what later clauses set
 // Facts       K, P, the conditions before the comparison and the clauses behind $x are repeatable;
 //             a condition before it reads $x alone, or nothing that is set for $x, or cannot fail;
 //             so do the clauses behind $x; what these leave in variables cannot be told; in a sum
@@ -29,6 +30,7 @@
 
 #include <algorithm>
 #include <string_view>
+#include <utility>
 
 namespace xquery {
 namespace {
@@ -84,7 +86,13 @@ std::string_view obstacleToSum(const XQueryFLWORExpr& expr, const XQueryFacts& s
   return {};
 }
 
-// "return if (C) then T else ()", and "else 0" in a sum.
+// Whether the expression answers no item, and does nothing.
+bool isNothingAt(const XQueryPlanning& planning, XQueryPlaceID place) {
+  const XQueryFacts& facts = planning.facts[place];
+  return facts.most == 0 && facts.deeds == 0 && facts.assigns.isEmpty();
+}
+
+// "return if (C) then T else ()", and "else 0" in a sum; or "if (C) then () else T".
 void joinConditional(XQueryPlanning& planning, XQueryPlaceID place, XQueryFLWORExpr& expr) {
   const XQueryProgram& program = planning.program;
   const XQueryPlaceID part = program.part(place, XQueryRole::Return);
@@ -93,14 +101,16 @@ void joinConditional(XQueryPlanning& planning, XQueryPlaceID place, XQueryFLWORE
   if (program[conditional].expr->kind() != Kind::ConditionalExpr) return;
   const XQueryPlaceID test = program.part(conditional, XQueryRole::Test);
   if (test == XQueryNoPlace) return;
-  const XQueryPlaceID then = program.nextPart(test);
-  const XQueryPlaceID other = then == XQueryNoPlace ? XQueryNoPlace : program.nextPart(then);
+  XQueryPlaceID then = program.nextPart(test);
+  XQueryPlaceID other = then == XQueryNoPlace ? XQueryNoPlace : program.nextPart(then);
   if (other == XQueryNoPlace) return;
-  const XQueryFacts& ofOther = planning.facts[other];
-  const bool isNothing = ofOther.most == 0 && ofOther.deeds == 0 && ofOther.assigns.isEmpty();
+  const bool isReversed = isNothingAt(planning, then) && !isNothingAt(planning, other);
+  if (isReversed) std::swap(then, other);
+  const bool isNothing = isNothingAt(planning, other);
   const bool isZero = !isNothing && XQuerySmallIntegerIn(program[other].expr) == 0 &&
                       sumOf(program, place) == Sum::Plain;
-  XQueryClauseJoins joins(planning, place, part, test, Picks::WhereItHolds);
+  XQueryClauseJoins joins(planning, place, part, test,
+                          isReversed ? Picks::WhereItFails : Picks::WhereItHolds);
   std::string_view obstacle;
   if (!expr.orderSpecs().empty()) {
     obstacle = "what is ordered by may fail for an item that would be left out";

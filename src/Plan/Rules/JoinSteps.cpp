@@ -15,6 +15,7 @@
 //             once, in an order that does not depend on how it was found
 #include "Plan/Joins/XQueryJoin.h"
 #include "Plan/Joins/XQueryJoinedSteps.h"
+#include "Plan/Joins/XQueryJoinOfSeveral.h"
 #include "Plan/Joins/XQueryTermsBehind.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
@@ -58,7 +59,7 @@ void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryWalkedPath& p
     if (!condition.terms.empty()) {
       if (path.steps().empty()) XQueryAddTermsBehind(planning, place, condition);
       planning.choose(place);
-      return path.setPicker(XQueryJoin::ofStep(path, std::move(condition), false), start);
+      return path.setPicker(XQueryJoinsOfStep(path, std::move(condition), false), start);
     }
   }
   const auto& steps = path.steps();
@@ -74,7 +75,7 @@ void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryWalkedPath& p
     const bool looksAround = facts.does(XQueryDeeds::ReadsOutside);
     if (i + 1 == steps.size()) XQueryAddTermsBehind(planning, place, condition);
     planning.choose(place);
-    return path.setPicker(XQueryJoin::ofStep(path, std::move(condition), looksAround),
+    return path.setPicker(XQueryJoinsOfStep(path, std::move(condition), looksAround),
                           steps[i].step);
   }
 }
