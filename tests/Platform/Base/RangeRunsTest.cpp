@@ -179,7 +179,8 @@ size_t offeredBytesAround(const char* address) {
 
 // The system may have taken them already.
 void expectOffered(const char* begin, size_t bytes) {
-  if (isInMemory(begin + bytes / 2)) EXPECT_GT(offeredBytesAround(begin), 0u);
+  if (!isInMemory(begin + bytes / 2)) return;
+  EXPECT_GT(offeredBytesAround(begin), 0u);
 }
 
 TEST(RangeRuns, LargeBlocksAreOfferedToTheSystemAndGoBackWithOthersOnRequest) {
