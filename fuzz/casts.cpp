@@ -101,8 +101,8 @@ void checkCastable(size_t type, const Outcome& outcome, std::string_view from) {
         std::string(from) + "\n" + outcome.text);
 }
 
-// The zeros that begin the fraction of a duration's seconds are lost in reading: 1.05 is read as 1.5,
-// which need not be what so many seconds can hold to the last digit.
+// The zeros that begin the fraction of a duration's seconds are lost in reading: 1.05 is read
+// as 1.5, which need not be what so many seconds can hold to the last digit.
 bool losesZeros(std::string_view name, std::string_view form) {
   return name.ends_with("ration") && form.find(".0") != form.npos;
 }
