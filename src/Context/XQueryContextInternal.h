@@ -53,6 +53,10 @@ class XQueryContextInternal {
   const Value* variableSlotForID(int64_t varID) const {
     return _variables ? _variables->slotForID(varID) : nullptr;
   }
+  // The value of a variable that is not read again in the call; the frame may let go of it.
+  Value lastValueOfVariable(int64_t varID) {
+    return _variables ? _variables->lastValueForID(varID) : Value();
+  }
   // ID 0 is ignored.
   void setVariable(Value value, int64_t forID) {
     if (!_variables) _variables = make<XQueryFrame>();

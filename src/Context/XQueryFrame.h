@@ -1,6 +1,6 @@
 // One frame of local variables, indexed by local variable ID.
 //
-//   | count | IDs 1 to 10: in the frame itself | IDs from 11 on: in a vector |
+//   | count, lets take | IDs 1 to 10: in the frame itself | IDs from 11 on: in a vector |
 //
 // Every call of a declared function has a frame of its own. A frame is one block of the object
 // allocator's largest recycled size, so that a call of a function with few variables allocates
@@ -15,6 +15,7 @@
 #include <cstdint>
 #include <memory>
 #include <new>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -46,9 +47,20 @@ class XQueryFrame : public NSCounted {
     }
   }
 
+  // The value where the variable is read for the last time: the frame keeps NSNull in its place if
+  // it lets go of values. Null for an ID below 1 or past the end.
+  Value lastValueForID(int64_t varID) {
+    Value* slot = const_cast<Value*>(slotForID(varID));
+    if (!slot) return {};
+    return _letsTake ? std::exchange(*slot, Value(NSNull::null())) : *slot;
+  }
+  // To be set for a call of which every part is evaluated once at most. A frame in which a body is
+  // asked for something else than its value may be asked again.
+  void setLetsTake() { _letsTake = true; }
+
  protected:
   XQueryFrame() : NSCounted(Kind::Frame) {}
-  ~XQueryFrame() override { std::destroy_n(_near, std::min(_count, nearSlots)); }
+  ~XQueryFrame() override { std::destroy_n(_near, std::min<size_t>(_count, nearSlots)); }
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
@@ -69,7 +81,8 @@ class XQueryFrame : public NSCounted {
     ++_count;
   }
 
-  size_t _count = 0;
+  uint32_t _count = 0;
+  bool _letsTake = false;
   // Those in use are made as they are set: most calls set two or three.
   union {
     Value _near[nearSlots];

@@ -1,5 +1,6 @@
 #include "Expr/XQuerySequence.h"
 
+#include "Expr/XQueryListChanges.h"
 #include "Platform/Base/WorkMeter.h"
 
 #include <algorithm>
@@ -7,6 +8,19 @@
 #include <vector>
 
 namespace xquery {
+namespace {
+
+// Whether adding the array to an empty sequence adds its elements as they are.
+bool isFlat(const NSArray& array) {
+  if (array.kind() == Kind::Sequence) return true;
+  WorkPacer pacer;
+  return std::all_of(array.objects().begin(), array.objects().end(), [&](const Value& element) {
+    pacer.turn();
+    return element && !isNull(element) && !isa<NSArray>(element);
+  });
+}
+
+}  // namespace
 
 Ref<XQuerySequence> XQuerySequence::sequenceWithItem(Value item) {
   auto sequence = XQuerySequence::sequence();
@@ -45,8 +59,24 @@ void XQuerySequence::addObject(const Value& item) {
 void XQuerySequence::addObject(Value&& item) {
   if (item && !isNull(item) && !isa<NSArray>(item)) {
     _objects.push_back(std::move(item));
+  } else if (NSArray* array = XQueryOwnArray(item); array && isFlat(*array)) {
+    takeObjects(array->objects());
+  } else if (item && item->kind() == Kind::Sequence) {
+    const auto& objects = cast<XQuerySequence>(item)->_objects;
+    XQueryAppendItems(objects, 0, objects.size(), _objects);
   } else {
     addObject(std::as_const(item));
+  }
+}
+
+// Of both lists the shorter one moves, so that a list that grows at either end by a few items at a
+// time is never moved item by item.
+void XQuerySequence::takeObjects(std::vector<Value>& of) {
+  if (of.size() > _objects.size()) {
+    XQueryInsertItems(of, 0, std::move(_objects));
+    _objects = std::move(of);
+  } else {
+    XQueryInsertItems(_objects, _objects.size(), std::move(of));
   }
 }
 
@@ -79,13 +109,7 @@ const Value& normalisedIn(const Value& value) {
 
 Value flattened(Value value) {
   if (!value || value->kind() != Kind::Array) return value;  // an XQuerySequence is flat
-  WorkPacer pacer;
-  const auto isItem = [&pacer](const Value& element) {
-    pacer.turn();
-    return element && !isNull(element) && !isa<NSArray>(element);
-  };
-  const std::vector<Value>& elements = cast<NSArray>(value)->objects();
-  if (std::all_of(elements.begin(), elements.end(), isItem)) return value;
+  if (isFlat(*cast<NSArray>(value))) return value;
   return XQuerySequence::sequenceWithItem(value);
 }
 

@@ -19,7 +19,7 @@ class XQuerySequence : public NSArray {
   [[nodiscard]] static Ref<XQuerySequence> sequenceWithItem(Value item);
 
   void addObject(const Value& item);
-  // Takes over an item that is no array.
+  // Takes over an item that is no array, and the items of an array that nobody else holds.
   void addObject(Value&& item);
   // Ignores null and NSNull and does not flatten; into an empty sequence the index is not looked
   // at, past the end it appends.
@@ -32,6 +32,9 @@ class XQuerySequence : public NSArray {
   XQuerySequence() : NSArray(Kind::Sequence) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
+
+ private:
+  void takeObjects(std::vector<Value>& of);
 };
 
 inline bool isNull(const Value& value) {

@@ -1,5 +1,6 @@
 #include "Functions/Sequence.h"
 
+#include "Expr/XQueryListChanges.h"
 #include "Expr/XQuerySequence.h"
 #include "Functions/Numeric.h"
 #include "Functions/XQueryTextArgument.h"
@@ -15,6 +16,7 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -36,12 +38,12 @@ Value checkedCount(const Value* arguments, size_t count, size_t fewest, size_t m
 
 using Items = std::vector<Value>;
 
-// Appends `count` items of the list from `first` on.
-void append(const XQueryItemList& list, size_t first, size_t count, Items& items) {
-  WorkPacer pacer;
-  for (size_t index = first; index < first + count; ++index) {
-    pacer.turn();
-    items.emplace_back(list[index]);
+// Appends `count` items of the value from `first` on.
+void append(const Value& list, size_t first, size_t count, Items& items) {
+  if (const auto* array = dyn_cast<NSArray>(list)) {
+    XQueryAppendItems(array->objects(), first, count, items);
+  } else if (count > 0) {
+    items.push_back(list);
   }
 }
 
@@ -64,6 +66,113 @@ bool readInteger(const Value& argument, int64_t& position, XQueryContext& contex
 bool readRounded(const Value& argument, int64_t& position, XQueryContext& context) {
   const Value number = XQueryPromoteToNumeric(argument, context);
   return readPosition(xqround(number, 0, false, context), position);
+}
+
+// --- functions whose answer consists of the items of a list -----------------------------------
+
+Value reversed(Value sequence) {
+  const XQueryItemList list(sequence.get());
+  if (list.count() < 2) return normalised(std::move(sequence));
+  if (NSArray* own = XQueryOwnArray(sequence)) {
+    checkWork(list.count() / WorkPacer::turnsPerStep);
+    std::reverse(own->objects().begin(), own->objects().end());
+    return sequence;
+  }
+  Items items;
+  items.reserve(list.count());
+  WorkPacer pacer;
+  for (size_t index = list.count(); index > 0; --index) {
+    pacer.turn();
+    items.emplace_back(list[index - 1]);
+  }
+  return sequenceOf(std::move(items));
+}
+
+Value withInserted(Value target, size_t before, const Value& inserted) {
+  NSArray* own = XQueryOwnArray(target);
+  const size_t count = itemCount(target);
+  const size_t insertedCount = itemCount(inserted);
+  Items items;
+  items.reserve(insertedCount + (own ? 0 : count));
+  // What is known to be flat stays so.
+  if (own && (own->kind() != Kind::Sequence || inserted->kind() != Kind::Array)) {
+    append(inserted, 0, insertedCount, items);
+    XQueryInsertItems(own->objects(), before, std::move(items));
+    return normalised(std::move(target));
+  }
+  append(target, 0, before, items);
+  append(inserted, 0, insertedCount, items);
+  append(target, before, count - before, items);
+  return normalised(sequenceOf(std::move(items)));
+}
+
+Value without(Value target, size_t first, size_t count) {
+  if (NSArray* own = XQueryOwnArray(target)) {
+    XQueryEraseItems(own->objects(), first, count);
+    return target;
+  }
+  const size_t behind = itemCount(target) - first - count;
+  Items items;
+  items.reserve(first + behind);
+  append(target, 0, first, items);
+  append(target, first + count, behind, items);
+  return sequenceOf(std::move(items));
+}
+
+Value part(Value of, size_t first, size_t count) {
+  if (NSArray* own = XQueryOwnArray(of)) {
+    XQueryEraseItems(own->objects(), first + count, own->count() - first - count);
+    XQueryEraseItems(own->objects(), 0, first);
+    return normalised(std::move(of));
+  }
+  Items chosen;
+  chosen.reserve(count);
+  append(of, first, count, chosen);
+  return normalised(sequenceOf(std::move(chosen)));
+}
+
+// An argument, to be looked at or, of a call that needs its arguments no longer, taken.
+Value handedOver(const Value& argument) {
+  return argument;
+}
+Value handedOver(Value& argument) {
+  return std::move(argument);
+}
+
+template <class Argument>
+Value answerInserting(Argument* arguments, size_t count, XQueryContext& context) {
+  int64_t position = 0;
+  if (count != 3 || !readInteger(arguments[1], position, context)) return Value();
+  const auto end = static_cast<int64_t>(itemCount(arguments[0])) + 1;
+  const auto before = static_cast<size_t>(std::clamp<int64_t>(position, 1, end) - 1);
+  return withInserted(handedOver(arguments[0]), before, arguments[2]);
+}
+
+// Answers a sequence whatever is left, be it one item or none.
+template <class Argument>
+Value answerRemoving(Argument* arguments, size_t count, XQueryContext& context) {
+  int64_t position = 0;
+  if (count != 2 || !readInteger(arguments[1], position, context)) return Value();
+  const size_t length = itemCount(arguments[0]);
+  const bool isInside = position >= 1 && static_cast<uint64_t>(position) <= length;
+  const size_t first = isInside ? static_cast<size_t>(position) - 1 : length;
+  return without(handedOver(arguments[0]), first, isInside ? 1 : 0);
+}
+
+// A start below 1 counts as 1 and takes nothing off the length.
+template <class Argument>
+Value answerSubsequence(Argument* arguments, size_t count, XQueryContext& context) {
+  if (count < 2 || count > 3) return Value();
+  const auto available = static_cast<int64_t>(itemCount(arguments[0]));
+  int64_t start = 0;
+  int64_t length = available;
+  if (!readRounded(arguments[1], start, context)) return Value();
+  if (count == 3 && !readRounded(arguments[2], length, context)) return Value();
+  const int64_t first = std::max<int64_t>(start, 1) - 1;
+  if (length < 1 || first >= available) return NSNull::null();
+  const int64_t taken = std::min(length, available - first);
+  if (taken == available) return normalised(handedOver(arguments[0]));
+  return part(handedOver(arguments[0]), static_cast<size_t>(first), static_cast<size_t>(taken));
 }
 
 }  // namespace
@@ -94,17 +203,11 @@ Value fn_exactly_one(const Value* arguments, size_t count, XQueryContext&) {
 }
 
 Value fn_reverse(const Value* arguments, size_t count, XQueryContext&) {
-  if (count != 1) return Value();
-  const XQueryItemList list(arguments[0].get());
-  if (list.count() < 2) return normalised(arguments[0]);
-  Items items;
-  items.reserve(list.count());
-  WorkPacer pacer;
-  for (size_t index = list.count(); index > 0; --index) {
-    pacer.turn();
-    items.emplace_back(list[index - 1]);
-  }
-  return sequenceOf(std::move(items));
+  return count == 1 ? reversed(arguments[0]) : Value();
+}
+
+Value XQueryReverseOwn(Value* arguments, size_t count, XQueryContext&) {
+  return count == 1 ? reversed(std::move(arguments[0])) : Value();
 }
 
 Value fn_unordered(const Value* arguments, size_t count, XQueryContext&) {
@@ -149,52 +252,27 @@ Value fn_distinct_values(const Value* arguments, size_t count, XQueryContext& co
 }
 
 Value fn_insert_before(const Value* arguments, size_t count, XQueryContext& context) {
-  int64_t position = 0;
-  if (count != 3 || !readInteger(arguments[1], position, context)) return Value();
-  const XQueryItemList target(arguments[0].get());
-  const XQueryItemList inserted(arguments[2].get());
-  const auto end = static_cast<int64_t>(target.count()) + 1;
-  const auto before = static_cast<size_t>(std::clamp<int64_t>(position, 1, end) - 1);
-  Items items;
-  items.reserve(target.count() + inserted.count());
-  append(target, 0, before, items);
-  append(inserted, 0, inserted.count(), items);
-  append(target, before, target.count() - before, items);
-  return normalised(sequenceOf(std::move(items)));
+  return answerInserting(arguments, count, context);
 }
 
-// Answers a sequence whatever is left, be it one item or none.
+Value XQueryInsertIntoOwn(Value* arguments, size_t count, XQueryContext& context) {
+  return answerInserting(arguments, count, context);
+}
+
 Value fn_remove(const Value* arguments, size_t count, XQueryContext& context) {
-  int64_t position = 0;
-  if (count != 2 || !readInteger(arguments[1], position, context)) return Value();
-  const XQueryItemList target(arguments[0].get());
-  const size_t length = target.count();
-  const bool isInside = position >= 1 && static_cast<uint64_t>(position) <= length;
-  const size_t before = isInside ? static_cast<size_t>(position) - 1 : length;
-  Items items;
-  items.reserve(length);
-  append(target, 0, before, items);
-  if (isInside) append(target, before + 1, length - before - 1, items);
-  return sequenceOf(std::move(items));
+  return answerRemoving(arguments, count, context);
 }
 
-// A start below 1 counts as 1 and takes nothing off the length.
+Value XQueryRemoveFromOwn(Value* arguments, size_t count, XQueryContext& context) {
+  return answerRemoving(arguments, count, context);
+}
+
 Value fn_subsequence(const Value* arguments, size_t count, XQueryContext& context) {
-  if (count < 2 || count > 3) return Value();
-  const XQueryItemList items(arguments[0].get());
-  const auto available = static_cast<int64_t>(items.count());
-  int64_t start = 0;
-  int64_t length = available;
-  if (!readRounded(arguments[1], start, context)) return Value();
-  if (count == 3 && !readRounded(arguments[2], length, context)) return Value();
-  const int64_t first = std::max<int64_t>(start, 1) - 1;
-  if (length < 1 || first >= available) return NSNull::null();
-  const int64_t taken = std::min(length, available - first);
-  if (taken == available) return normalised(arguments[0]);
-  Items chosen;
-  chosen.reserve(static_cast<size_t>(taken));
-  append(items, static_cast<size_t>(first), static_cast<size_t>(taken), chosen);
-  return normalised(sequenceOf(std::move(chosen)));
+  return answerSubsequence(arguments, count, context);
+}
+
+Value XQuerySubsequenceOfOwn(Value* arguments, size_t count, XQueryContext& context) {
+  return answerSubsequence(arguments, count, context);
 }
 
 }  // namespace xquery

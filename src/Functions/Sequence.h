@@ -23,4 +23,11 @@ Value fn_insert_before(const Value* arguments, size_t count, XQueryContext& cont
 Value fn_remove(const Value* arguments, size_t count, XQueryContext& context);
 Value fn_subsequence(const Value* arguments, size_t count, XQueryContext& context);
 
+// The same for arguments of a call that are no longer needed: a list that nobody else holds becomes
+// the answer.
+Value XQueryReverseOwn(Value* arguments, size_t count, XQueryContext& context);
+Value XQueryInsertIntoOwn(Value* arguments, size_t count, XQueryContext& context);
+Value XQueryRemoveFromOwn(Value* arguments, size_t count, XQueryContext& context);
+Value XQuerySubsequenceOfOwn(Value* arguments, size_t count, XQueryContext& context);
+
 }  // namespace xquery

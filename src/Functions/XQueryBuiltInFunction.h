@@ -23,6 +23,8 @@ class XQueryContext;
 //   an XQueryError  a failure, which the call raises
 //   null            wrong arguments: a wrong number of them, or of a kind that cannot be used
 using XQueryProcedure = Value (*)(const Value* arguments, size_t count, XQueryContext& context);
+// The same for arguments that are not needed behind the call, and may be taken apart.
+using XQueryTakingProcedure = Value (*)(Value* arguments, size_t count, XQueryContext& context);
 
 class XQueryBuiltInFunction : public NSCounted {
  public:
@@ -87,6 +89,8 @@ class XQueryBuiltInFunction : public NSCounted {
     Arguments arguments;
     Answer answer;
     uint32_t traits = 0;
+    // Null for most.
+    XQueryTakingProcedure takingProc = nullptr;
 
     bool has(Traits trait) const { return (traits & trait) != 0; }
     bool takes(size_t argumentCount) const {

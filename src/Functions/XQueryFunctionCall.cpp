@@ -95,12 +95,24 @@ bool XQueryFunctionCall::evaluateArguments(XQueryContext& context) const {
 // The arguments go straight into the callee's frame, which is not in force yet. False for an error
 // among them.
 inline bool XQueryFunctionCall::makeFrame(XQueryFrameRef& frame, XQueryContext& context) const {
-  const auto& params = _functionDecl->params();
-  if (!params.empty()) frame = make<XQueryFrame>();
-  for (size_t index = 0; index < params.size(); ++index) {
-    Value value = argument(index, context);
-    if (XQueryHasFailed(value, context)) return false;
-    if (const int64_t varID = params[index]->varID()) frame->setValue(std::move(value), varID);
+  const size_t count = _functionDecl->params().size();
+  if (count > 0) frame = make<XQueryFrame>();
+  for (size_t index = 0; index < count; ++index) {
+    if (!isLateArgument(index) && !passArgument(index, *frame, context)) return false;
+  }
+  if (_lateArguments == 0) return true;
+  for (size_t index = 0; index < count; ++index) {
+    if (isLateArgument(index) && !passArgument(index, *frame, context)) return false;
+  }
+  return true;
+}
+
+inline bool XQueryFunctionCall::passArgument(size_t index, XQueryFrame& to,
+                                             XQueryContext& context) const {
+  Value value = argument(index, context);
+  if (XQueryHasFailed(value, context)) return false;
+  if (const int64_t varID = _functionDecl->params()[index]->varID()) {
+    to.setValue(std::move(value), varID);
   }
   return true;
 }
@@ -117,6 +129,7 @@ Value XQueryFunctionCall::callDeclared(XQueryContext& context) const {
   }
   XQueryFrameRef frame;
   if (!makeFrame(frame, context)) return {};
+  if (frame) frame->setLetsTake();
   const CalleeFrame calleeFrame(dynamic, std::move(frame));
   const CalleeProlog calleeProlog(dynamic, _functionDecl->prolog());
   Value result = _functionDecl->expr()->evaluateWithContext(context);
@@ -192,14 +205,22 @@ Value XQueryFunctionCall::callBuiltIn(Value* arguments, size_t count,
   }
   // An argument without a value, as "." is without a focus, is none that a function could use.
   if (!isComplete) return failInvalidArguments(context);
-  return callBuiltInWith(arguments, count, context);
+  const XQueryTakingProcedure taking = _builtIn->row().takingProc;
+  if (!taking) return callBuiltInWith(arguments, count, context);
+  const CalleeFrame calleeFrame(dynamic, nullptr);
+  return checkedAnswer(taking(arguments, count, context), context);
 }
 
 Value XQueryFunctionCall::callBuiltInWith(const Value* arguments, size_t count,
                                           XQueryContext& context) const {
+  const CalleeFrame calleeFrame(_internal(context), nullptr);
+  return checkedAnswer(_function(arguments, count, context), context);
+}
+
+// Of a built-in function, for its arguments.
+Value XQueryFunctionCall::checkedAnswer(Value answer, XQueryContext& context) const {
   auto& dynamic = _internal(context);
-  const CalleeFrame calleeFrame(dynamic, nullptr);
-  Value result = normalised(_function(arguments, count, context));
+  Value result = normalised(std::move(answer));
   if (!result) return failInvalidArguments(context);
   if (auto* error = dyn_cast<XQueryError>(result)) return dynamic.fail(error, exprPlace());
   return result;

@@ -6,6 +6,7 @@
 #include "Functions/XQueryBuiltInFunction.h"
 
 #include <cstddef>
+#include <cstdint>
 #include <functional>
 #include <span>
 #include <utility>
@@ -34,6 +35,14 @@ class XQueryFunctionCall : public XQueryExpr {
   // A built-in function wins over a declared one of the same name, whatever the number of
   // arguments. A name that cannot be resolved is no error before the call is evaluated.
   void bindInfoForProlog(XQueryProlog& prolog) override;
+
+  // Of a call of a declared function: the argument is evaluated behind those that are not late.
+  // That cannot fail, and nobody can tell when it is done.
+  void setLateArgument(size_t index) { _lateArguments |= uint64_t{1} << index; }
+  bool isLateArgument(size_t index) const {
+    return index < mostLateArguments && ((_lateArguments >> index) & 1) != 0;
+  }
+  static constexpr size_t mostLateArguments = 64;
 
   // Evaluates the arguments and calls. The callee sees none of the caller's local variables; of a
   // declared function the body is evaluated in the static context of the prolog that declared it.
@@ -71,9 +80,11 @@ class XQueryFunctionCall : public XQueryExpr {
   }
   bool evaluateArguments(XQueryContext& context) const;
   bool makeFrame(Ref<XQueryFrame>& frame, XQueryContext& context) const;
+  bool passArgument(size_t index, XQueryFrame& to, XQueryContext& context) const;
   Value callDeclared(XQueryContext& context) const;
   Value callBuiltIn(XQueryContext& context) const;
   Value callBuiltIn(Value* arguments, size_t count, XQueryContext& context) const;
+  Value checkedAnswer(Value answer, XQueryContext& context) const;
   // Out of line: what they need of the stack is no part of a recursion's frames.
   [[gnu::noinline, gnu::cold]] Value failInBody(const Value& result, XQueryContext& context) const;
   [[gnu::noinline, gnu::cold]] Value failUndefined(XQueryContext& context) const;
@@ -83,6 +94,7 @@ class XQueryFunctionCall : public XQueryExpr {
   XQueryProcedure _function = nullptr;
   const XQueryBuiltInFunction* _builtIn = nullptr;
   XQueryFunctionDecl* _functionDecl = nullptr;
+  uint64_t _lateArguments = 0;
 };
 
 }  // namespace xquery

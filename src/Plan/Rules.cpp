@@ -83,6 +83,12 @@ constexpr std::array rules = {
     // Behind what it adds without making it.
     XQueryRule{"folds", "what a loop yields is summed up or compared as it comes, without a list",
                XQueryFoldNumbers},
+    XQueryRule{"functions",
+               "functions of numbers are computed with machine numbers, calls included",
+               XQueryComputeFunctions},
+    // Behind all that evaluates expressions otherwise than they are written.
+    XQueryRule{"last uses", "a list that is read for the last time is changed instead of copied",
+               XQueryTakeLastUses},
 };
 
 }  // namespace

@@ -58,5 +58,7 @@ void XQueryLookUpValues(XQueryPlanning& planning);
 void XQueryAskEarly(XQueryPlanning& planning);
 void XQueryComputeScalars(XQueryPlanning& planning);
 void XQueryFoldNumbers(XQueryPlanning& planning);
+void XQueryComputeFunctions(XQueryPlanning& planning);
+void XQueryTakeLastUses(XQueryPlanning& planning);
 
 }  // namespace xquery

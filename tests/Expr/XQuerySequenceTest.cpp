@@ -39,6 +39,37 @@ TEST(XQuerySequence, FlatteningIsNotBoundedByTheStack) {
   EXPECT_EQ(joined(*sequence), "x");
 }
 
+TEST(XQuerySequence, AddingAListThatNobodyElseHoldsTakesItsItems) {
+  for (const bool isLonger : {false, true}) {
+    auto sequence = XQuerySequence::sequenceWithItem(text("a"));
+    if (!isLonger) sequence->addObject(text("b"));
+    std::vector<Value> items = {text("c"), text("d")};
+    if (!isLonger) items.pop_back();
+    const NSObject* const first = items.front().get();
+    sequence->addObject(Value(NSArray::arrayWithObjects(std::move(items))));
+    EXPECT_EQ(joined(*sequence), isLonger ? "acd" : "abc");
+    EXPECT_EQ(sequence->objectAtIndex(isLonger ? 1 : 2), first);
+  }
+}
+
+TEST(XQuerySequence, AddingAListThatOthersHoldLeavesItAsItIs) {
+  const Value list = NSArray::arrayWithObjects({text("b"), text("c")});
+  const Value flat = XQuerySequence::sequenceWithItem(list);
+  for (const Value& held : {list, flat}) {
+    auto sequence = XQuerySequence::sequenceWithItem(text("a"));
+    sequence->addObject(Value(held));
+    EXPECT_EQ(joined(*sequence), "abc");
+    EXPECT_EQ(joined(*cast<NSArray>(held)), "bc");
+  }
+}
+
+TEST(XQuerySequence, AddingAnArrayThatNobodyElseHoldsFlattensIt) {
+  auto sequence = XQuerySequence::sequenceWithItem(text("a"));
+  sequence->addObject(Value(NSArray::arrayWithObjects(
+      {NSArray::arrayWithObjects({text("b"), text("c")}), NSNull::null(), text("d")})));
+  EXPECT_EQ(joined(*sequence), "abcd");
+}
+
 TEST(XQuerySequence, InsertingDoesNotFlatten) {
   auto sequence = XQuerySequence::sequenceWithItem(text("a"));
   auto array = NSArray::arrayWithObjects({text("b"), text("c")});

@@ -367,5 +367,80 @@ TEST(DistinctValues, TakesOneOrTwoArguments) {
   EXPECT_EQ(refusedCounts(fn_distinct_values, string("a")), "0 3 4 5");
 }
 
+// --- lists that nobody else holds ----------------------------------------------------------------
+
+struct OwnCase {
+  XQueryProcedure plain;
+  XQueryTakingProcedure taking;
+  std::vector<Value> others;  // the arguments behind the list
+};
+
+std::vector<OwnCase> ownCases() {
+  std::vector<OwnCase> cases = {{fn_reverse, XQueryReverseOwn, {}}};
+  const std::vector<Value> positions = {integer(-5), integer(0), integer(1),  integer(2),
+                                        integer(3),  integer(9), string("x"), empty()};
+  for (const Value& position : positions) {
+    cases.push_back({fn_remove, XQueryRemoveFromOwn, {position}});
+    cases.push_back({fn_subsequence, XQuerySubsequenceOfOwn, {position}});
+    for (const Value& other : positions) {
+      cases.push_back({fn_subsequence, XQuerySubsequenceOfOwn, {position, other}});
+      cases.push_back({fn_insert_before, XQueryInsertIntoOwn, {position, other}});
+    }
+    cases.push_back({fn_insert_before, XQueryInsertIntoOwn, {position, pair()}});
+  }
+  return cases;
+}
+
+// A new one of so many items each time.
+Value listOf(int count) {
+  if (count == 0) return empty();
+  if (count == 1) return integer(7);
+  std::vector<Value> items;
+  for (int each = 0; each < count; ++each) items.push_back(integer(each));
+  return sequence(std::move(items));
+}
+
+std::string taken(const OwnCase& example, Value list) {
+  return outcome([&](XQueryContext& context) {
+    std::vector<Value> arguments = {std::move(list)};
+    arguments.insert(arguments.end(), example.others.begin(), example.others.end());
+    return example.taking(arguments.data(), arguments.size(), context);
+  });
+}
+
+TEST(OwnLists, BecomeWhatThePlainFunctionsAnswer) {
+  for (const OwnCase& example : ownCases()) {
+    for (const int count : {0, 1, 2, 3, 50}) {
+      std::vector<Value> arguments = {listOf(count)};
+      arguments.insert(arguments.end(), example.others.begin(), example.others.end());
+      EXPECT_EQ(taken(example, listOf(count)), call(example.plain, arguments));
+    }
+  }
+}
+
+TEST(OwnLists, AreCopiedWhereOthersHoldThem) {
+  for (const OwnCase& example : ownCases()) {
+    const Value list = listOf(5);
+    const std::string before = show(list);
+    std::vector<Value> arguments = {list};
+    arguments.insert(arguments.end(), example.others.begin(), example.others.end());
+    EXPECT_EQ(taken(example, list), call(example.plain, arguments));
+    EXPECT_EQ(show(list), before);
+  }
+}
+
+TEST(OwnLists, AreRefusedLikeAnyArguments) {
+  for (const auto& example : ownCases()) {
+    for (size_t count = 0; count < 5; ++count) {
+      std::vector<Value> arguments(count, integer(1));
+      const std::string plain = call(example.plain, arguments);
+      EXPECT_EQ(outcome([&](XQueryContext& context) {
+                  return example.taking(arguments.data(), count, context);
+                }),
+                plain);
+    }
+  }
+}
+
 }  // namespace
 }  // namespace xquery

@@ -30,22 +30,24 @@ void XQueryConditionalExpr::visitParts(XQueryPartVisitor& visitor) {
 
 Value XQueryConditionalExpr::computeValue(XQueryContext& context) const {
   XQueryCheckStack(context);
-  const XQueryExpr* branch = nullptr;
-  {
-    const Value test = XQueryEvaluateOrEmpty(_test.get(), context);
-    if (XQueryHasFailed(test, context)) return {};
-    const Value truth = XQueryEffectiveBooleanValue(test, context);
-    if (truth == NSNumber::trueValue()) {
-      branch = _then.get();
-    } else if (truth == NSNumber::falseValue()) {
-      branch = _else.get();
-    } else {
-      return failConversion(context);
-    }
-  }
-  Value value = XQueryEvaluateOrEmpty(branch, context);
+  const auto test = testIn(context);
+  if (!test) return _internal(context).isFailing() ? Value() : failConversion(context);
+  Value value = XQueryEvaluateOrEmpty(*test ? _then.get() : _else.get(), context);
   if (value || _internal(context).isFailing()) return value;
   return failConversion(context);
+}
+
+// Nothing after an error, and for a test that is neither.
+inline std::optional<bool> XQueryConditionalExpr::testIn(XQueryContext& context) const {
+  if (_teller) {
+    if (const auto truth = _teller->truth(context)) return truth;
+  }
+  const Value test = XQueryEvaluateOrEmpty(_test.get(), context);
+  if (XQueryHasFailed(test, context)) return std::nullopt;
+  const Value truth = XQueryEffectiveBooleanValue(test, context);
+  if (truth == NSNumber::trueValue()) return true;
+  if (truth == NSNumber::falseValue()) return false;
+  return std::nullopt;
 }
 
 // Out of line: what it needs of the stack is no part of a recursion's frames.

@@ -2,7 +2,9 @@
 #pragma once
 
 #include "Expr/XQueryExpr.h"
+#include "Expr/XQueryTruthTeller.h"
 
+#include <optional>
 #include <utility>
 
 namespace xquery {
@@ -16,6 +18,9 @@ class XQueryConditionalExpr : public XQueryExpr {
   [[nodiscard]] static Ref<XQueryConditionalExpr> condionalExpr(Ref<XQueryExpr> test,
                                                                 Ref<XQueryExpr> thenExpr,
                                                                 Ref<XQueryExpr> elseExpr);
+
+  // Tells of the test, which holds the teller.
+  void setTeller(const XQueryTruthTeller* ofTest) { _teller = ofTest; }
 
   void bindInfoForProlog(XQueryProlog& prolog) override;
   Value computeValue(XQueryContext& context) const override;
@@ -32,11 +37,13 @@ class XQueryConditionalExpr : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
  private:
+  std::optional<bool> testIn(XQueryContext& context) const;
   [[gnu::noinline, gnu::cold]] Value failConversion(XQueryContext& context) const;
 
   Ref<XQueryExpr> _test;
   Ref<XQueryExpr> _then;
   Ref<XQueryExpr> _else;
+  const XQueryTruthTeller* _teller = nullptr;
 };
 
 }  // namespace xquery

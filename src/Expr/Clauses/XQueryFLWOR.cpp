@@ -337,7 +337,9 @@ bool XQueryFLWORExpr::addPicks(uint64_t number, XQueryFLWORResults& toResults,
 }
 
 bool XQueryFLWORExpr::processItem(XQueryFLWORResults& toResults, XQueryContext& withContext) const {
-  if (_whereExpr) {
+  const auto holds = _teller ? _teller->truth(withContext) : std::nullopt;
+  if (holds && !*holds) return true;
+  if (_whereExpr && !holds) {
     const Value where = _whereExpr->evaluateWithContext(withContext);
     if (XQueryHasFailed(where, withContext)) return false;
     // Only false drops the tuple: an error record lets it through.

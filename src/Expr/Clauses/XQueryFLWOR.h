@@ -4,6 +4,7 @@
 #include "Expr/XQueryBinding.h"
 #include "Expr/XQueryExpr.h"
 #include "Expr/XQuerySequence.h"
+#include "Expr/XQueryTruthTeller.h"
 
 #include <cstdint>
 #include <optional>
@@ -142,6 +143,8 @@ class XQueryFLWORExpr : public XQueryExpr {
     _yieldingExpr = std::move(expr);
     _yielder = yielder;
   }
+  // Tells of the where clause, which holds the teller.
+  void setTeller(const XQueryTruthTeller* ofWhere) { _teller = ofWhere; }
   // Its value, of which only the first so many items are wanted: others may be left out.
   Value firstItems(uint64_t most, XQueryContext& context) const;
   void visitParts(XQueryPartVisitor& visitor) override;
@@ -192,6 +195,7 @@ class XQueryFLWORExpr : public XQueryExpr {
   Yield _yield;
   Ref<XQueryExpr> _yieldingExpr;  // keeps the yielder
   const XQueryItemYielder* _yielder = nullptr;
+  const XQueryTruthTeller* _teller = nullptr;
 };
 
 // "ordered {...}" and "unordered {...}": the ordering mode for the extent of the operand.

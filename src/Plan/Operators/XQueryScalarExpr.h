@@ -10,57 +10,19 @@
 #pragma once
 
 #include "Expr/Clauses/XQueryItemFold.h"
+#include "Expr/XQueryTruthTeller.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
+#include "Plan/Operators/XQueryScalar.h"
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <utility>
 #include <vector>
 
 namespace xquery {
 
 class XQueryContextInternal;
-
-// A number, a truth value, or an object that has not been looked at. Unknown: it takes evaluating
-// the expression to tell.
-struct XQueryScalar {
-  enum Form : uint8_t { Unknown, Integer, Double, Truth, Object };
-
-  Form form = Unknown;
-  union {
-    int64_t integer = 0;
-    double number;
-    bool truth;
-    const NSObject* object;  // kept alive by whom it was taken from
-  };
-
-  static XQueryScalar ofInteger(int64_t value) {
-    XQueryScalar scalar;
-    scalar.form = Integer;
-    scalar.integer = value;
-    return scalar;
-  }
-  static XQueryScalar ofDouble(double value) {
-    XQueryScalar scalar;
-    scalar.form = Double;
-    scalar.number = value;
-    return scalar;
-  }
-  static XQueryScalar ofTruth(bool value) {
-    XQueryScalar scalar;
-    scalar.form = Truth;
-    scalar.truth = value;
-    return scalar;
-  }
-  // Unknown where there is none.
-  static XQueryScalar ofObject(const NSObject* value) {
-    XQueryScalar scalar;
-    if (!value) return scalar;
-    scalar.form = Object;
-    scalar.object = value;
-    return scalar;
-  }
-};
 
 // The steps of such a computation. Operands stand before what they are operands of.
 class XQueryScalarSteps {
@@ -109,7 +71,9 @@ class XQueryScalarSteps {
   std::vector<Step> _steps;
 };
 
-class XQueryScalarExpr : public XQueryPlannedExpr, public XQueryItemYielder {
+class XQueryScalarExpr : public XQueryPlannedExpr,
+                         public XQueryItemYielder,
+                         public XQueryTruthTeller {
  public:
   [[nodiscard]] static Ref<XQueryScalarExpr> exprWithPlain(Ref<XQueryExpr> plain,
                                                            XQueryScalarSteps steps) {
@@ -119,6 +83,7 @@ class XQueryScalarExpr : public XQueryPlannedExpr, public XQueryItemYielder {
   Value computeValue(XQueryContext& context) const override;
   const XQueryItemYielder* itemYielder() const override { return this; }
   bool yieldTo(XQueryItemFold& fold, XQueryContext& context) const override;
+  std::optional<bool> truth(const XQueryContext& context) const override;
 
  protected:
   XQueryScalarExpr(Ref<XQueryExpr> plain, XQueryScalarSteps steps)

@@ -4,10 +4,13 @@
 //             others of these, local variables, ".", position(), last() and numbers; arithmetic of
 //             one operator alone gains nothing
 // Facts       of a variable and of ".": it may be a number, or untyped in arithmetic; compared, it
-//             is surely one; and no other rule has put something in the place of a part
+//             or what it is compared with is surely one; and no other rule has put something in the
+//             place of a part
 // Operator    XQueryScalarExpr
 // Why         looking at variables and the focus cannot fail and leaves nothing behind, so that the
 //             expression can still be evaluated as a whole wherever machine numbers do not tell
+#include "Expr/Clauses/XQueryConditional.h"
+#include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Functions/Boolean.h"
@@ -30,8 +33,8 @@ using Steps = XQueryScalarSteps;
 using StepKind = XQueryScalarSteps::Kind;
 using Added = std::optional<Steps::Index>;
 
-// What an operand is for.
-enum class Use : uint8_t { Arithmetic, Comparison, Logic };
+// What an operand is for; the other side of a comparison may be known to be a number.
+enum class Use : uint8_t { Arithmetic, Comparison, ComparisonWithNumber, Logic };
 
 // The classes of operators, as XQueryOperatorExpr::operatorClassification numbers them.
 constexpr int logicalClass = 1, arithmeticClass = 2, valueClass = 5, generalClass = 6;
@@ -89,14 +92,24 @@ class Compiler {
     if (use == Use::Logic || (!variable && !isa<XQueryContextItem>(&expr))) return std::nullopt;
     if (variable && variable->varID() <= 0) return std::nullopt;
     const XQueryFacts& facts = _planning.facts[place];
-    constexpr auto numbers = XQueryItems::Integer | XQueryItems::Double;
-    const bool fits = use == Use::Comparison
-                          ? facts.are(XQueryItems::Numeric) && facts.mayBe(numbers)
-                          : facts.mayBe(numbers | XQueryItems::Untyped | XQueryItems::Node);
-    if (!fits) return std::nullopt;
+    if (!fits(facts, use)) return std::nullopt;
     step.kind = variable ? StepKind::Variable : StepKind::ContextItem;
     step.varID = variable ? variable->varID() : 0;
     return _steps.add(step);
+  }
+
+  static bool fits(const XQueryFacts& facts, Use use) {
+    constexpr auto numbers = XQueryItems::Integer | XQueryItems::Double;
+    if (use == Use::Comparison) return facts.are(XQueryItems::Numeric) && facts.mayBe(numbers);
+    if (use == Use::ComparisonWithNumber) return facts.mayBe(numbers);
+    return facts.mayBe(numbers | XQueryItems::Untyped | XQueryItems::Node);
+  }
+
+  // Of a comparison of these two.
+  Use useIn(XQueryPlaceID left, XQueryPlaceID right) const {
+    const bool isNumber = _planning.facts[left].are(XQueryItems::Numeric) ||
+                          _planning.facts[right].are(XQueryItems::Numeric);
+    return isNumber ? Use::ComparisonWithNumber : Use::Comparison;
   }
 
   static bool isTruth(const XQueryExpr& expr) {
@@ -123,6 +136,7 @@ class Compiler {
     const XQueryPlaceID second = _program.nextPart(first);
     const int type = operation->operatorType();
     const auto code = static_cast<uint8_t>(type);
+    if (second == XQueryNoPlace && !operation->isSign()) return std::nullopt;
     // A quotient of integers is a decimal.
     if (type == XQueryOperatorDiv && areExact(first) && areExact(second)) return std::nullopt;
     switch (XQueryOperatorExpr::operatorClassification(type)) {
@@ -135,11 +149,11 @@ class Compiler {
                    ? addSign(code, first, level)
                    : addOf(StepKind::Arithmetic, code, first, second, Use::Arithmetic, level);
       case valueClass:
-        return addOf(StepKind::Comparison, code, first, second, Use::Comparison, level);
+        return addOf(StepKind::Comparison, code, first, second, useIn(first, second), level);
       case generalClass: {
         constexpr int distance = XQueryOperatorEq - XQueryOperatorEqual;
         return addOf(StepKind::Comparison, static_cast<uint8_t>(type + distance), first, second,
-                     Use::Comparison, level);
+                     useIn(first, second), level);
       }
       default:
         return std::nullopt;
@@ -184,6 +198,21 @@ class Compiler {
   int _operations = 0;
 };
 
+// Where it is a condition, nobody asks for the truth value as an object.
+void tellTruth(const XQueryProgram& program, XQueryPlaceID place, const XQueryTruthTeller& teller) {
+  place = XQueryPlaceAround(program, place);
+  const XQueryPlace& here = program[place];
+  if (here.role == XQueryRole::Test) {
+    if (auto* conditional = dyn_cast<XQueryConditionalExpr>(program[here.parent].expr)) {
+      conditional->setTeller(&teller);
+    }
+  } else if (here.role == XQueryRole::Where) {
+    if (auto* flwor = dyn_cast<XQueryFLWORExpr>(program[here.parent].expr)) {
+      flwor->setTeller(&teller);
+    }
+  }
+}
+
 }  // namespace
 
 void XQueryComputeScalars(XQueryPlanning& planning) {
@@ -198,8 +227,9 @@ void XQueryComputeScalars(XQueryPlanning& planning) {
     auto steps = Compiler(planning).stepsAt(place);
     if (!steps) continue;
     areDone[place] = true;
-    planning.wrap(place,
-                  XQueryScalarExpr::exprWithPlain(planning.exprAt(place), std::move(*steps)));
+    const auto scalar = XQueryScalarExpr::exprWithPlain(planning.exprAt(place), std::move(*steps));
+    planning.wrap(place, scalar);
+    tellTruth(program, place, *scalar);
   }
 }
 

@@ -1,0 +1,61 @@
+#include "Plan/Operators/XQueryScalarBody.h"
+
+#include "Context/XQueryContextInternal.h"
+#include "Types/XQueryNumber.h"
+
+#include <array>
+
+namespace xquery {
+namespace {
+
+// Of an argument; an object unless there is no more to it than whether it is true.
+XQueryScalar scalarOf(const NSObject* argument) {
+  if (argument == NSNumber::trueValue()) return XQueryScalar::ofTruth(true);
+  if (argument == NSNumber::falseValue()) return XQueryScalar::ofTruth(false);
+  return isa<XQueryNumber>(argument) ? XQueryScalar::ofObject(argument) : XQueryScalar();
+}
+
+}  // namespace
+
+// Null where it is not known. Which object an answer is can be told: an argument, which the frame
+// holds, or a literal is answered itself.
+Value XQueryScalarBody::valueOf(const XQueryScalar& answer, XQueryContext& context) const {
+  switch (answer.form) {
+    case XQueryScalar::Integer:
+      return XQueryNumber::integerWithInt64(answer.integer);
+    case XQueryScalar::Double:
+      return XQueryNumber::numberWithDouble(answer.number);
+    case XQueryScalar::Truth:
+      return NSNumber::numberWithBool(answer.truth);
+    case XQueryScalar::Object:
+      for (const auto& literal : _program->literals) {
+        if (literal->literalValue() == answer.object) return literal->computeValue(context);
+      }
+      return const_cast<NSObject*>(answer.object);
+    case XQueryScalar::Unknown:
+      break;
+  }
+  return {};
+}
+
+Value XQueryScalarBody::computeValue(XQueryContext& context) const {
+  auto& dynamic = _internal(context);
+  const bool isOpen = _failures.load(std::memory_order_relaxed) < mostFailures;
+  // A profile counts what is evaluated.
+  if (!isOpen || dynamic.profile()) return plain().evaluateWithContext(context);
+  std::array<XQueryScalar, XQueryScalarProgram::mostSlots> slots;
+  bool areNumbers = true;
+  for (size_t index = 0; index < _parameters.size(); ++index) {
+    slots[index] = scalarOf(dynamic.variableForID(_parameters[index]));
+    areNumbers = areNumbers && slots[index].form != XQueryScalar::Unknown;
+  }
+  bool outOfStack = false;
+  if (areNumbers) {
+    const XQueryScalar answer = _program->scalars.answer(_function, slots.data(), outOfStack);
+    if (Value value = valueOf(answer, context)) return value;
+  }
+  _failures.fetch_add(outOfStack ? mostFailures : 1, std::memory_order_relaxed);
+  return plain().evaluateWithContext(context);
+}
+
+}  // namespace xquery

@@ -1,0 +1,285 @@
+// Declared functions over numbers, computed with machine numbers.
+#include "Expr/RandomChoices.h"
+#include "Plan/PlanTesting.h"
+
+#include <chrono>
+#include <string>
+
+namespace xquery {
+namespace {
+
+using namespace plantest;
+
+// Where the stack ends depends on the way.
+void agree(std::string_view text, const Value& contextItem = {}) {
+  const Outcome plain = outcomeOf(*compiled(text), contextItem);
+  const Outcome planned = outcomeOf(*compiled(text, XQueryWay::Planned), contextItem);
+  EXPECT_TRUE(plain.lines == planned.lines || (endedAtLimit(plain) && endedAtLimit(planned)))
+      << text;
+}
+
+size_t computedIn(std::string_view text) {
+  return choicesOf("functions", text);
+}
+
+std::string function(const std::string& parameters, const std::string& body,
+                     const std::string& call) {
+  return "declare function local:f(" + parameters + ") { " + body + " }; " + call;
+}
+
+const Value& numbers() {
+  static const Value parsed = document("<r><n>3</n><n>4.5</n><n/><n>x</n><n>1e2</n></r>");
+  return parsed;
+}
+
+TEST(ScalarFunctions, AreComputedWhateverTheirForm) {
+  const struct {
+    const char* parameters;
+    const char* body;
+    const char* call;
+  } cases[] = {
+      {"$n", "if ($n < 2) then $n else local:f($n - 1) + local:f($n - 2)", "local:f(12)"},
+      {"$a, $b", "if ($b = 0) then $a else local:f($b, $a mod $b)",
+       "for $i in 1 to 9, $j in 5 to 9 return local:f($i, $j)"},
+      {"$n",
+       "if ($n eq 1) then 0 else if ($n mod 2 = 0) then 1 + local:f($n idiv 2) else 1 + "
+       "local:f(3 * $n + 1)",
+       "for $i in 1 to 30 return local:f($i)"},
+      {"$x as xs:double, $y as xs:double, $n as xs:integer",
+       "let $xx := $x * $x let $yy := $y * $y return if ($n ge 50 or $xx + $yy gt 4e0) then $n "
+       "else local:f($xx - $yy - 0.5e0, 2e0 * $x * $y + 0.3e0, $n + 1)",
+       "local:f(0e0, 0e0, 0)"},
+      {"$b, $n",
+       "if ($n = 0) then 1 else let $h := local:f($b, $n idiv 2) return if ($n mod 2 = "
+       "0) then $h * $h else $h * $h * $b",
+       "local:f(3, 20), local:f(1.5e0, 20)"},
+      {"$n", "-$n + +$n * -1", "local:f(7), local:f(-0e0), local:f(2.5e0)"},
+      {"$n", "not($n > 3) and ($n != 2 or false()) or $n >= 9 and true()",
+       "for $i in 0 to 10 return local:f($i)"},
+      {"$n", "(if (($n) <= (4)) then (($n)) else (5))", "for $i in 3 to 6 return local:f($i)"},
+      {"$n", "let $n := $n + 1 let $m := $n * 2 return (let $n := $m return $n + $m)",
+       "local:f(1)"},
+      {"$n", "if (if ($n > 0) then $n > 5 else $n < -5) then 1 else 0",
+       "for $i in -7 to 7 return local:f($i)"},
+      {"", "1 + 2 * 3", "local:f()"},
+  };
+  for (const auto& example : cases) {
+    const std::string text = function(example.parameters, example.body, example.call);
+    EXPECT_EQ(computedIn(text), 1U) << text;
+    sameBothWays(text);
+  }
+}
+
+TEST(ScalarFunctions, MayCallEachOther) {
+  const std::string text =
+      "declare function local:even($n) { if ($n = 0) then true() else local:odd($n - 1) };"
+      "declare function local:odd($n) { if ($n = 0) then false() else local:even($n - 1) };"
+      "declare function local:third($n) { local:even($n) and count(1 to $n) > 2 };"
+      "for $i in 0 to 7 return (local:even($i), local:odd($i), local:third($i))";
+  EXPECT_EQ(computedIn(text), 2U);
+  sameBothWays(text);
+}
+
+TEST(ScalarFunctions, AreThoseOfNumbersAlone) {
+  for (const char* body : {"'x'",
+                           "$n",
+                           "3",
+                           "concat($n, 1)",
+                           "$n[1]",
+                           "$n/a",
+                           ". + $n",
+                           "$g + $n",
+                           "count($n) + 1",
+                           "for $i in 1 to $n return $i",
+                           "sum(1 to $n) + $n",
+                           "let $x as xs:integer := $n return $x + 1",
+                           "let $x := $n where $x > 1 return $x",
+                           "$n + position()",
+                           "local:g($n) + 1",
+                           "1 to $n",
+                           "$n is $n",
+                           "($n, 1)",
+                           "()",
+                           "some $i in $n satisfies $i = 1",
+                           "$n + 1.5",
+                           "$n cast as xs:integer",
+                           "$n + 99999999999999999999"}) {
+    const std::string text = function("$n", body, "local:f(1)");
+    EXPECT_EQ(computedIn(text), 0U) << text;
+    sameBothWays(text);
+  }
+}
+
+TEST(ScalarFunctions, TakeWhateverTheyAreCalledWith) {
+  for (const char* body :
+       {"if ($n < 2) then $n else local:f($n - 1) + $n", "$n + 1", "if ($n) then 1 else 0",
+        "if ($n = 3) then $n else $n * 2", "not($n)", "-$n", "$n idiv 2", "$n div 2", "$n mod 0",
+        "let $m := $n return $m", "if ($n > 2 and $n < 5) then true() else $n"}) {
+    for (const char* argument : {"3",
+                                 "4.5",
+                                 "1.5e0",
+                                 "()",
+                                 "(1, 2)",
+                                 "'x'",
+                                 "'3'",
+                                 "true()",
+                                 "false()",
+                                 "xs:untypedAtomic('3')",
+                                 "xs:byte(3)",
+                                 "xs:float(2.5)",
+                                 "xs:decimal(3)",
+                                 "-0e0",
+                                 "xs:double('NaN')",
+                                 "xs:double('INF')",
+                                 "9223372036854775807",
+                                 "9007199254740993",
+                                 "99999999999999999999",
+                                 "xs:date('2004-01-01')",
+                                 "//n",
+                                 "//n[1]",
+                                 "//n[3]",
+                                 "//n[4]",
+                                 "string(//n[2])",
+                                 "<a>1</a>"}) {
+      agree(function("$n", body, std::string("local:f(") + argument + ")"), numbers());
+    }
+  }
+}
+
+// Objects that are the same stay so, and others do not become so.
+TEST(ScalarFunctions, AnswerTheSameObjects) {
+  for (const char* text :
+       {"(1 to 4)/local:f(.)", "let $l := (1, 2, 3, 1) return ($l/local:f(.), $l)",
+        "(local:f(1), local:f(1), local:f(7))/.", "let $x := 7 return ($x, local:f($x))/.",
+        "let $x := 5e0 return (local:f($x), local:f($x), $x)/.",
+        "(local:f(local:f(7)), local:f(8))/."}) {
+    for (const char* body :
+         {"if ($n < 3) then 1 else $n", "if ($n < 3) then 1 else $n + 0", "let $m := 2 return $m",
+          "if ($n > 100) then $n else if ($n > 3) then local:f($n + 100) else $n",
+          "if ($n < 3) then true() else $n = 7",
+          "let $m := $n return if ($m > 2) then $m else 0"}) {
+      sameBothWays(function("$n", body, text));
+    }
+  }
+}
+
+TEST(ScalarFunctions, FailAsEver) {
+  for (const char* body :
+       {"if ($n = 0) then 1 idiv $n else\n local:f($n - 1)",
+        "if ($n = 0) then $u else\n 1 + local:f($n - 1)",
+        "if ($n = 0) then $n mod 0 else\n local:f($n - 1) + 1",
+        "let $z := 1 div ($n - 3) return\n if ($n = 0) then $z else local:f($n - 1)"}) {
+    sameBothWays(function("$n", body, "local:f(5)"));
+    sameBothWays(function("$n", body, "for $i in 1 to 50 return local:f(2)"));
+  }
+}
+
+TEST(ScalarFunctions, GrowBeyondMachineNumbers) {
+  for (const char* text : {"local:f(30)", "for $i in 15 to 40 return local:f($i)",
+                           "local:f(5), local:f(25), local:f(25.0), local:f(25e0)"}) {
+    sameBothWays(function("$n", "if ($n <= 1) then 1 else $n * local:f($n - 1)", text));
+  }
+  sameBothWays(function("$n, $a", "if ($n = 0) then $a else local:f($n - 1, $a * 3 + $n)",
+                        "local:f(100, 1), local:f(39, 1)"));
+}
+
+TEST(ScalarFunctions, EndWhereTheStackEnds) {
+  const XQueryLimits limits = boundedBy(std::chrono::seconds(60));
+  for (const char* body :
+       {"local:f($n + 1)", "1 + local:f($n + 1)", "if (local:f($n + 1) = 1) then 1 else 2"}) {
+    const std::string text = function("$n", body, "local:f(1)");
+    const Outcome outcome = outcomeOf(*compiled(text, XQueryWay::Planned), {}, {}, limits);
+    ASSERT_TRUE(endedAtLimit(outcome)) << text;
+    EXPECT_NE(outcome.lines.front().find("nested too deeply"), std::string::npos) << text;
+  }
+}
+
+TEST(ScalarFunctions, EndAtADeadline) {
+  const XQueryLimits limits = boundedBy(std::chrono::milliseconds(50));
+  const std::string text =
+      function("$n", "if ($n < 2) then $n else local:f($n - 1) + local:f($n - 2)", "local:f(80)");
+  const auto begin = std::chrono::steady_clock::now();
+  EXPECT_TRUE(endedAtLimit(outcomeOf(*compiled(text, XQueryWay::Planned), {}, {}, limits)));
+  EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(5));
+}
+
+class ProgramOfNumbers {
+ public:
+  explicit ProgramOfNumbers(unsigned seed) : _random(seed) {}
+
+  std::string text() {
+    std::string all;
+    for (const char* name : {"local:f", "local:g"}) {
+      all += std::string("declare function ") + name + "($n, $x) { if ($n <= 0) then " + term(0) +
+             " else\n " + term(4) + " };\n";
+    }
+    return all + "for $v in (" + _random.oneOf({"1, 2", "3", "2, 'a', 3"}) + ") return (" +
+           "local:f($v, " + constant() + "), local:g(2, $v), local:f(2, local:g(1, 2)))";
+  }
+
+ private:
+  std::string constant() {
+    return _random.oneOf(
+        {"0", "1", "2", "7", "-3", "1.5e0", "0e0", "9223372036854775807", "1e300", "2.5"});
+  }
+
+  std::string condition(int depth) {
+    const std::string relation =
+        _random.oneOf({" = ", " < ", " > ", " <= ", " >= ", " != ", " eq ", " lt ", " ne "});
+    const std::string simple = term(depth - 1) + relation + term(depth - 1);
+    switch (_random.below(6)) {
+      case 0:
+        return "(" + simple + ") and $n > 1";
+      case 1:
+        return "not(" + simple + ")";
+      case 2:
+        return "(" + simple + ") or $x = 2";
+      case 3:
+        return term(depth - 1);
+      default:
+        return simple;
+    }
+  }
+
+  std::string term(int depth) {
+    if (depth <= 0) {
+      return _random.below(4) == 0 ? constant() : _random.oneOf({"$n", "$x", "$n", "true()"});
+    }
+    switch (_random.below(9)) {
+      case 0:
+        return "(if (" + condition(depth) + ") then " + term(depth - 1) + " else " +
+               term(depth - 1) + ")";
+      case 1:
+        return "(let $y := " + term(depth - 1) + " return " +
+               _random.oneOf({"$y + $n", "$y", "$y * $y", "$x - $y"}) + ")";
+      case 2:
+        return "(let $x := " + term(depth - 1) + " let $n := $n - 1 return " + term(depth - 1) +
+               ")";
+      case 3:
+      case 4:
+        return _random.oneOf({"local:f(", "local:g("}) + "$n - " + _random.oneOf({"1", "2"}) +
+               ", " + term(depth / 2) + ")";
+      case 5:
+        return "-" + term(0);
+      default:
+        return "(" + term(depth - 1) +
+               _random.oneOf({" + ", " - ", " * ", " idiv ", " mod ", " div "}) + term(depth - 1) +
+               ")";
+    }
+  }
+
+  RandomChoices _random;
+};
+
+TEST(ScalarFunctions, AgreeWithThePlainWayOverGeneratedPrograms) {
+  size_t computed = 0;
+  for (unsigned seed = 0; seed < 600; ++seed) {
+    const std::string text = ProgramOfNumbers(seed).text();
+    computed += computedIn(text);
+    agree(text);
+  }
+  EXPECT_GT(computed, 300U);
+}
+
+}  // namespace
+}  // namespace xquery
