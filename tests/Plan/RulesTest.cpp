@@ -221,6 +221,11 @@ TEST(KeepInvariants, TakesOverWhateverTheFormOfTheLoop) {
            "every $i in 1 to 9, $a in //a satisfies $i",
            "for $i in 1 to 9 return (some $a in //a satisfies $a = $i)",
            "$g[@sku = //line/sku]",
+           "let $l := $g/line return $h[not(@sku = $l/sku)]",
+           "declare variable $l := $g/line; $h[not(@sku = $l/sku)]",
+           "declare function local:f($p, $l) { $p/@sku = $l/sku }; let $l := $g/line return "
+           "$h[local:f(., $l)]",
+           "let $l := $g/line for $p in $h where $p/@sku != $l/@sku return $p",
            "$g[number(price) = max($h/a/price[1])]",
            "$g/(//a)",
            "declare function local:f($a) { //a[. = 1] }; for $i in 1 to 9 return local:f($i)",
@@ -246,7 +251,8 @@ TEST(KeepInvariants, LeavesOthersAlone) {
         "for $i in 1 to 9 return <a>{//b/<c/>}</a>",   // makes nodes
         "for $i in 1 to 9 return trace(//a, 'a')",     // the trace, but see below
         "$g[count(//a[position() = 1]) = position()]/b",
-        "for $i in 1 to 9 return $k/a/b",                  // as quickly done as looked up
+        "for $k in $g for $i in 1 to 9 return $k/a/b",  // as quickly done as looked up
+        "for $i in $g let $l := $i/line return $l/sku",
         "for $i in 1 to 9 return 1 to 100",                // never made
         "let $d := (1, 2) for $i in $d return count($d)",  // without looking at any item
         "let $d := 1 for $i in 1 to 9 return max($d)",     // one item

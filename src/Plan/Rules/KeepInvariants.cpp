@@ -25,10 +25,14 @@
 #include "Plan/Operators/XQueryKeptExpr.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/PlaceInside.h"
+#include "Prolog/XQueryDeclarations.h"
 
 #include <algorithm>
 #include <iterator>
+#include <set>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -46,7 +50,7 @@ bool isAtHand(const XQueryExpr* expr) {
 }
 
 // A path from a variable or the context item over a few children or attributes is done as quickly
-// as looked up.
+// as looked up, where it begins with one node.
 bool isShort(const XQueryPathExpr& path) {
   constexpr int fewSteps = 3;
   int steps = 0;
@@ -83,6 +87,7 @@ class Search {
         _isLaborious(planning.program.placeCount()) {}
 
   void run() {
+    noteLists();
     for (const XQueryPlaceID place : _program.partsFirst()) {
       _isLaborious[place] = _isLaborious[place] || isLaborious(place) || isWalked(place);
       const XQueryPlaceID whole = at(place).parent;
@@ -101,7 +106,7 @@ class Search {
     const XQueryExpr& expr = *at(place).expr;
     switch (expr.kind()) {
       case Kind::PathExpr:
-        return !isShort(*cast<XQueryPathExpr>(&expr));
+        return !isShort(*cast<XQueryPathExpr>(&expr)) || beginsWithList(place);
       case Kind::FLWORExpr:
       case Kind::QuantifiedExpr:
         return true;
@@ -111,6 +116,49 @@ class Search {
       }
       default:
         return false;
+    }
+  }
+
+  // Whether a path goes on from a variable that has been given a list.
+  bool beginsWithList(XQueryPlaceID path) const {
+    const XQueryPlaceID first = _program.part(path, XQueryRole::FirstStep);
+    if (first == XQueryNoPlace || facts(first).most != XQueryFacts::many) return false;
+    const auto* variable = dyn_cast<XQueryVariable>(at(first).expr);
+    if (!variable) return false;
+    if (variable->varID() == 0) return true;
+    const XQueryPlaceID binder = at(first).binder;
+    if (binder != XQueryNoPlace) return at(binder).expr->kind() == Kind::LetExpr;
+    return isComparedList(path, *variable);
+  }
+
+  // Whether a function compares what a path finds from a parameter that some call passes a list
+  // for: the calls of a loop mostly pass the same one.
+  bool isComparedList(XQueryPlaceID path, const XQueryVariable& parameter) const {
+    const XQueryFunctionDecl* function = _program.bodyOf(path).function;
+    if (!function || _lists.count({function, parameter.varID()}) == 0) return false;
+    const XQueryPlaceID whole = at(XQueryPlaceAround(_program, path)).parent;
+    if (whole == XQueryNoPlace) return false;
+    const auto* comparison = dyn_cast<XQueryOperatorExpr>(at(whole).expr);
+    constexpr int generalClass = 6;
+    return comparison &&
+           XQueryOperatorExpr::operatorClassification(comparison->operatorType()) == generalClass;
+  }
+
+  // Notes the parameters for which some call passes many items.
+  void noteLists() {
+    for (XQueryPlaceID place = 0; place < _program.placeCount(); ++place) {
+      const auto* call = dyn_cast<XQueryFunctionCall>(at(place).expr);
+      if (!call || !call->hasBody()) continue;
+      const XQueryPlaceID arguments = _program.part(place, XQueryRole::Arguments);
+      XQueryPlaceID each =
+          arguments == XQueryNoPlace ? XQueryNoPlace : _program.firstPart(arguments);
+      for (const auto& parameter : call->functionDecl()->params()) {
+        if (each == XQueryNoPlace) break;
+        const bool isList =
+            facts(each).most == XQueryFacts::many && facts(each).are(XQueryItems::Node);
+        if (isList) _lists.insert({call->functionDecl(), parameter->varID()});
+        each = _program.nextPart(each);
+      }
     }
   }
 
@@ -164,8 +212,8 @@ class Search {
       const XQueryRole role = at(inner).role;
       if (role == XQueryRole::Body) {
         // A function may be called any number of times, in any focus.
-        return _program.bodyOf(inner).function && own.reads.isEmpty() &&
-               !own.does(XQueryDeeds::ReadsItem);
+        return _program.bodyOf(inner).function && !own.does(XQueryDeeds::ReadsItem) &&
+               (own.reads.isEmpty() || beginsWithList(place));
       }
       if (XQueryTraitsOf(role).hasOwnFocus) return !own.does(XQueryDeeds::ReadsItem);
       switch (loopAround(inner, own.reads)) {
@@ -209,6 +257,7 @@ class Search {
   XQueryPlanning& _planning;
   const XQueryProgram& _program;
   std::vector<bool> _isLaborious;
+  std::set<std::pair<const XQueryFunctionDecl*, int64_t>> _lists;  // parameters, by their IDs
 };
 
 }  // namespace
