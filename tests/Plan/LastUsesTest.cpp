@@ -38,6 +38,12 @@ TEST(LastUses, AreThoseBehindWhichNobodyReadsTheVariable) {
       {"if ($n = 0) then () else (local:f(remove($s, 1), $n - 1), $s[1])", 0},
       {"if ($n = 0) then () else (local:f(remove($s, 1), $n - 1), $n)", 2},
       {"if ($n = 0) then $s else local:f(reverse($s), $n - 1)", 1},
+      {"if ($n = 0) then $s else local:f($s[position() > 1], $n - 1)", 1},
+      {"if ($n = 0) then $s else local:f($s[position() = 2 to last()], $n - 1)", 1},
+      {"if ($n = 0) then $s else local:f($s[position() != 1], $n - 1)", 1},
+      {"if ($n = 0) then $s else local:f($s[. > 1][position() > 1], $n - 1)", 0},
+      {"if ($n = 0) then $s else local:f($s[position() > count($s) - 2], $n - 1)", 0},
+      {"if ($n = 0) then $s else local:f($s[position() > 1]/.., $n - 1)", 0},
       {"if ($n = 0) then $s else local:f(insert-before($s, 2, $n), $n - 1)", 1},
       {"if ($n = 0) then $s else local:f(insert-before($s, 2, $s), $n - 1)", 0},
       {"if ($n = 0) then $s else local:f(insert-before(1, 2, $s), $n - 1)", 0},
@@ -159,7 +165,7 @@ class ProgramOfLists {
           {"$s", "$t", "$s", "$t", "$s[1]", "$t[last()]", "()", "(7, 8)", "'x'", "count($t)"});
     }
     const int next = depth - 1;
-    switch (_random.below(13)) {
+    switch (_random.below(14)) {
       case 0:
         return "(" + list(next) + ", " + list(next) + ")";
       case 1:
@@ -184,6 +190,11 @@ class ProgramOfLists {
                ") default return " + list(next) + ")";
       case 10:
         return "(for $i in " + list(0) + " return " + listOf("$i", 1) + ")";
+      case 11:
+        return _random.oneOf({"$s", "$t", "(" + list(next) + ")"}) + "[position() " +
+               _random.oneOf({"> 1", "!= 2", "= 2 to last()", "< last()", "<= $n",
+                              ">= 2 and position() != last()", "= count($s)"}) +
+               "]";
       default:
         return call(next / 2);
     }

@@ -49,6 +49,13 @@ constexpr const char* bounds[] = {"$n",
                                   "1 idiv 0",
                                   "true()",
                                   "last()",
+                                  "last() - 1",
+                                  "(2 to last())",
+                                  "(1 to last() - 1)",
+                                  "($n to last())",
+                                  "(last() to 2)",
+                                  "(2 to 'u')",
+                                  "(2e0 to 3)",
                                   "position()",
                                   "string-length($g/@n)",
                                   "($n to $n + 2)",
@@ -63,7 +70,8 @@ constexpr const char* bounds[] = {"$n",
                                   "(4294967297, 4294967298)",
                                   "(18446744073709551617, 18446744073709551618)",
                                   "(3, 3 + xs:integer('x'))"};
-constexpr const char* orders[] = {"<", "<=", ">", ">=", "lt", "le", "gt", "ge", "=", "eq"};
+constexpr const char* orders[] = {"<",  "<=", ">", ">=", "lt", "le",
+                                  "gt", "ge", "=", "eq", "!=", "ne"};
 constexpr const char* paths[] = {"$g/i[C]",
                                  "$g/i[C]/@k",
                                  "$g/i[@k > 2][C]",
@@ -110,11 +118,13 @@ TEST(PositionRanges, AreTakenAtOnce) {
         "$g/i[@k][position() >= $n]", "$g/i[position() > $n and position() < 2 * $n]",
         "$g/i[(position() > 1) and (position() < 5 and $n >= position())]",
         "($g/i)[position() <= count($g/j)]", "$g/i[position() <= 2]/@k", "$g/i[position() = $n]",
-        "$l[$n eq position()]", "$l[position() = ($n to $n + 2)]"}) {
+        "$l[$n eq position()]", "$l[position() = ($n to $n + 2)]", "$g/i[position() != $n]",
+        "$g/i[position() <= last()]", "$l[position() = 2 to last()]",
+        "$l[1 to last() - 1 = position()]", "$l[position() ne last()]"}) {
     EXPECT_EQ(choicesOf("ranges", loop + path), 1U) << path;
   }
   for (const char* path :
-       {"$g/i[position() != $n]", "$g/i[position() <= last()]", "$g/i[position() <= @k]",
+       {"$g/i[position() != @k]", "$g/i[position() <= last() + @k]", "$g/i[position() <= @k]",
         "$g/i[position() <= trace($n, 'n')]", "$g/i[@k <= $n]", "$g/i[position() <= $n or @k]",
         "$g/i[position() <= $n and @k]", "$g/i[position() <= 'u']"}) {
     EXPECT_EQ(choicesOf("ranges", loop + path), 0U) << path;

@@ -307,10 +307,13 @@ bool XQueryPathWalk::keepAtOnce(const XQueryExpr& predicate, std::vector<NSXMLNo
 // False where the predicate has to be asked of each node.
 bool XQueryPathWalk::keepRange(const XQueryPositionRange& range, std::vector<NSXMLNode*>& nodes) {
   if (nodes.empty()) return true;
-  const auto positions = range.positions(context);
+  const auto positions = range.positionsOf(nodes.size(), context);
   if (!positions) return false;
   nodes.resize(static_cast<size_t>(std::min<uint64_t>(positions->last, nodes.size())));
   const auto before = std::min<uint64_t>(positions->first - 1, nodes.size());
+  if (positions->hole > before && positions->hole <= nodes.size()) {
+    nodes.erase(nodes.begin() + static_cast<std::ptrdiff_t>(positions->hole - 1));
+  }
   nodes.erase(nodes.begin(), nodes.begin() + static_cast<std::ptrdiff_t>(before));
   return true;
 }
@@ -449,8 +452,8 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
     collectComputed(step, axis, node, nodes);
     return first + 1;
   }
-  const bool hasRange =
-      step.positions.range.predicate == first && !listingStep && !step.testMayRaise;
+  const bool hasRange = step.positions.range.predicate == first &&
+                        !step.positions.range.readsSize() && !listingStep && !step.testMayRaise;
   if (hasRange && collectRange(step, axis, node, nodes)) return first + 1;
   const bool isFromBack = step.positions.fromBack.predicate == first && axis == XQueryAxisChild;
   if (isFromBack && !listingStep && !step.testMayRaise) {
@@ -505,7 +508,7 @@ bool XQueryPathWalk::collectRange(const XQueryWalkedStep& step, int axis, NSXMLN
     if (!positions) positions = step.positions.range.positions(context);
     isOpen = positions.has_value();
     if (!isOpen || ++position > positions->last) return false;
-    if (position >= positions->first) nodes.push_back(found);
+    if (position >= positions->first && position != positions->hole) nodes.push_back(found);
     return position < positions->last;
   });
   return isOpen;

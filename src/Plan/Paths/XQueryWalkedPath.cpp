@@ -3,6 +3,7 @@
 #include "Context/StackGuard.h"
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Paths/XQueryPathResults.h"
+#include "Expr/XQueryListChanges.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Operators/XQueryNodeQuestion.h"
 #include "Plan/Paths/XQueryPathGivers.h"
@@ -112,21 +113,39 @@ Value itemsChosenAtOnce(const Value& items, const XQueryExpr& predicate, XQueryC
   return kept.value();
 }
 
-// As a predicate keeps them that asks for these positions; null where it has to be asked.
-Value itemsInRange(const Value& items, const XQueryPositionRange& range, XQueryContext& context) {
+// Takes out all but those in the range, which is not empty.
+void keepOwn(std::vector<Value>& items, const XQueryPositionRange::Positions& positions) {
+  const auto end = static_cast<size_t>(std::min<uint64_t>(positions.last, items.size()));
+  XQueryEraseItems(items, end, items.size() - end);
+  if (positions.hole >= positions.first && positions.hole <= end) {
+    XQueryEraseItems(items, static_cast<size_t>(positions.hole - 1), 1);
+  }
+  XQueryEraseItems(items, 0, static_cast<size_t>(positions.first - 1));
+}
+
+// Keeps the items as a predicate does that asks for these positions; false, and the items as they
+// were, where it has to be asked.
+bool keepRange(const XQueryPositionRange& range, Value& items, XQueryContext& context) {
   const XQueryItemList list(items.get());
-  if (list.count() == 0) return items;
-  const auto positions = range.positions(context);
-  if (!positions) return {};
+  if (list.count() == 0) return true;
+  const auto positions = range.positionsOf(list.count(), context);
+  if (!positions) return false;
+  const auto end = static_cast<size_t>(std::min<uint64_t>(positions->last, list.count()));
+  NSArray* own = items->kind() == Kind::Sequence ? XQueryOwnArray(items) : nullptr;
+  if (own && positions->first <= end) {
+    keepOwn(own->objects(), *positions);
+    items = normalised(std::move(items));
+    return true;
+  }
   XQueryGatherer kept;
   WorkPacer pacer;
-  const auto end = static_cast<size_t>(std::min<uint64_t>(positions->last, list.count()));
   for (uint64_t i = positions->first - 1; i < end; ++i) {
     pacer.turn();
     NSObject* item = list[static_cast<size_t>(i)];
-    if (item && item->kind() != Kind::Null) kept.add(item);
+    if (i + 1 != positions->hole && item && item->kind() != Kind::Null) kept.add(item);
   }
-  return kept.value();
+  items = kept.value();
+  return true;
 }
 
 // What deals with each node in the focus that there was before the walk.
@@ -192,6 +211,11 @@ XQueryStepPositions* XQueryWalkedPath::positionsOf(const XQueryStep& step) {
     if (each.step == &step) return each.isExpression() ? nullptr : &each.positions;
   }
   return nullptr;
+}
+
+bool XQueryWalkedPath::keepsRangeAlone() const {
+  return _start && _steps.empty() && !_picker && _start->predicates().size() == 1 &&
+         _startPositions.range.predicate == 0;
 }
 
 const XQueryWalkedStep* XQueryWalkedPath::walked(const XQueryStep& asWritten) const {
@@ -376,12 +400,10 @@ Value XQueryWalkedPath::evaluateStart(XQueryContext& context,
       ++index;
       continue;
     }
-    if (index == _startPositions.range.predicate) {
-      if (Value inRange = itemsInRange(items, _startPositions.range, context)) {
-        items = std::move(inRange);
-        ++index;
-        continue;
-      }
+    if (index == _startPositions.range.predicate &&
+        keepRange(_startPositions.range, items, context)) {
+      ++index;
+      continue;
     }
     const auto* question =
         _start->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicate.get());

@@ -87,6 +87,8 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   void takeSteps(XQueryWalkedPath& of);
   // What is told about the predicates of the start, or of an axis step; null for other steps.
   XQueryStepPositions* positionsOf(const XQueryStep& step);
+  // Whether it is no more than an expression of whose items a range of positions is kept.
+  bool keepsRangeAlone() const;
   // The items of the start are nodes in document order, and of one tree.
   void noteStartInOrder() { _isStartInOrder = true; }
   void setFindings(const Findings& findings) {

@@ -1,8 +1,8 @@
 // Variables that are read for the last time.
 //
-// Pattern     $v between commas, as an argument of a call of a declared function, or as the first
-//             argument of remove, insert-before, subsequence or reverse: f(($list, $new), $n - 1),
-//             $list[1] + f(subsequence($list, 2))
+// Pattern     $v between commas, as an argument of a call of a declared function, as the first
+//             argument of remove, insert-before, subsequence or reverse, or in front of a range of
+//             positions: f(($list, $new), $n - 1), $list[1] + f($list[position() > 1])
 // Facts       it is local to a function, of which no part from the body down to the variable is
 //             evaluated more than once, and what is evaluated behind it does not read the variable.
 //             What is left in the variable cannot be told
@@ -21,6 +21,7 @@
 #include "Plan/Operators/XQueryTakenVariable.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/PlaceInside.h"
 
 #include <algorithm>
@@ -59,6 +60,7 @@ class Search {
     const XQueryPlace& here = _program[place];
     if (here.parent == XQueryNoPlace) return false;
     if (here.role == XQueryRole::Element) return isList(here.parent);
+    if (here.role == XQueryRole::FirstStep) return keepsRange(here.parent);
     if (here.role != XQueryRole::Argument) return false;
     const auto* call = dyn_cast<XQueryFunctionCall>(_program[_program[here.parent].parent].expr);
     if (!call) return false;
@@ -67,6 +69,12 @@ class Search {
   }
 
   bool isList(XQueryPlaceID place) const { return _program[place].expr->kind() == Kind::ExprList; }
+
+  // Whether a path is walked there that does no more with the items of its start.
+  bool keepsRange(XQueryPlaceID place) const {
+    const auto* path = XQueryWalkedPathAt(_planning, place);
+    return path && path == _planning.exprAt(place).get() && path->keepsRangeAlone();
+  }
 
   bool isLastUse(XQueryPlaceID place, const XQueryVariableSet& own, Late& late) const {
     bool isHarmless = true;
@@ -162,6 +170,8 @@ class Search {
     switch (role) {
       case XQueryRole::Element:
         return isList(whole) && _planning.isOpen(whole);
+      case XQueryRole::FirstStep:
+        return keepsRange(whole);
       case XQueryRole::Argument:
         return expr.kind() == Kind::Args;
       case XQueryRole::Arguments:

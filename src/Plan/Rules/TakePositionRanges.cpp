@@ -1,10 +1,10 @@
 // The items from one position to another.
 //
-// Pattern     a[position() <= $n], $l[position() > 2 and $n >= position()], $l[position() = $n]:
-// one
-//             or more comparisons of the position by an order or for equality, joined by "and"
-// Facts       what the position is compared with is repeatable and reads no focus; nothing shows
-//             the focus that the predicate leaves (StepsAround.h)
+// Pattern     a[position() <= $n], $l[position() > 2 and $n >= position()], $l[position() = $n],
+//             $l[position() = 2 to last()], $l[position() != 1]: one or more comparisons of the
+//             position, joined by "and"
+// Facts       what the position is compared with is repeatable and reads no more of the focus than
+//             its size; nothing shows the focus that the predicate leaves (StepsAround.h)
 // Operator    none: the step is told (XQueryPositionRange). It works the positions out once for all
 //             of its items, takes these, and walks no further
 // Why         a comparison with one number answers the same for a position whichever item stands
@@ -30,6 +30,8 @@ bool keepsRow(int type) {
   switch (type) {
     case XQueryOperatorEqual:
     case XQueryOperatorEq:
+    case XQueryOperatorNotEqual:
+    case XQueryOperatorNe:
     case XQueryOperatorLess:
     case XQueryOperatorLessEqual:
     case XQueryOperatorGreater:
@@ -100,13 +102,15 @@ class Search {
     if (other == XQueryNoPlace || !isForAll(_planning.facts[other])) return false;
     const int type = comparison.operatorType();
     range.add(Ref<XQueryOperatorExpr>(&comparison), isOnLeft,
-              isOnLeft ? type : XQueryMirroredComparison(type));
+              isOnLeft ? type : XQueryMirroredComparison(type),
+              _planning.facts[other].does(XQueryDeeds::ReadsSize));
     return true;
   }
 
   static bool isForAll(const XQueryFacts& facts) {
     return facts.mayBe(XQueryItems::Numeric) && facts.isRepeatable() && facts.assigns.isEmpty() &&
-           !facts.does(XQueryDeeds::ReadsFocus | XQueryDeeds::LoadsDocuments);
+           !facts.does((XQueryDeeds::ReadsFocus & ~XQueryDeeds::ReadsSize) |
+                       XQueryDeeds::LoadsDocuments);
   }
 
   XQueryPlanning& _planning;
