@@ -3,7 +3,8 @@
 // Where characters end among the next twelve bytes tells how many of them one step can take: six of
 // at most two bytes, else four of at most three, else three of any length. A shuffle of the bytes
 // puts each character into a lane of its own, the last byte lowest, and the bits that say how long
-// it is are squeezed out of all lanes at once.
+// it is are squeezed out of all lanes at once. Processors that move lanes together by a mask have a
+// shorter way, `WidenByCompressing.h`.
 #pragma once
 
 #include <cstddef>

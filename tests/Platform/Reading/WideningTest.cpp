@@ -1,4 +1,4 @@
-#include "Platform/Reading/Widening.h"
+#include "Platform/Reading/VectorCode.h"
 
 #include <gtest/gtest.h>
 
@@ -6,6 +6,7 @@
 #include <random>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace xquery {
 namespace {
@@ -28,8 +29,13 @@ std::u16string widenedAll(Way way, std::string_view text) {
   return all;
 }
 
-void expectBothAlike(const std::string& text) {
-  EXPECT_EQ(widenedAll(widenSome, text), widenedAll(widenSomePlainly, text)) << text;
+// Whatever vectors the processor has.
+void expectAllAlike(const std::string& text) {
+  static const std::vector<VectorCode> codes = vectorCodes();
+  const std::u16string plain = widenedAll(widenSomePlainly, text);
+  for (const VectorCode& code : codes) {
+    EXPECT_EQ(widenedAll(code.widen, text), plain) << code.target << ": " << text;
+  }
 }
 
 std::string encoded(char32_t point) {
@@ -53,7 +59,7 @@ TEST(Widening, EveryCharacterInARow) {
   const std::u16string all = widenedAll(widenSome, text);
   EXPECT_EQ(all.front(), u'\1');
   EXPECT_GT(all.size(), 0x10000U);
-  EXPECT_EQ(all, widenedAll(widenSomePlainly, text));
+  expectAllAlike(text);
 }
 
 // Of each length, so that every way in which a step may begin occurs.
@@ -65,7 +71,7 @@ TEST(Widening, CharactersInEveryOrderAndTextsOfEveryLength) {
     for (unsigned count = 0; count < 150; ++count) {
       const size_t any = random() % std::size(characters);
       text += characters[favourite < std::size(characters) && random() % 8 ? favourite : any];
-      expectBothAlike(text);
+      expectAllAlike(text);
     }
   }
 }
@@ -74,10 +80,48 @@ TEST(Widening, LongTextsAreWidenedInParts) {
   std::string text;
   while (text.size() < 5 * widenedAtOnce) text += "а€bé\U0001D11E ";
   std::u16string units(text.size(), u'\0');
-  const Widened some = widenSome(text, units.data());
-  EXPECT_GE(some.bytes, widenedAtOnce);
-  EXPECT_LE(some.bytes, widenedAtOnce + 64);
-  expectBothAlike(text);
+  for (const VectorCode& code : vectorCodes()) {
+    const Widened some = code.widen(text, units.data());
+    EXPECT_GE(some.bytes, widenedAtOnce) << code.target;
+    EXPECT_LE(some.bytes, widenedAtOnce + 64) << code.target;
+  }
+  expectAllAlike(text);
+}
+
+// Each character of a text lies across the end of a part once, and so does each fault.
+TEST(Widening, APartEndsAnywhereInACharacter) {
+  const std::string_view seams[] = {"a",        "é",    "€",    "\U0001D11E",   "\xC3",
+                                    "\xE2\x82", "\xE2", "\xF0", "\xF0\x9F\x98", "\xF0\x9F"};
+  for (const std::string_view seam : seams) {
+    for (size_t before = 0; before < 8; ++before) {
+      std::string text(widenedAtOnce + 64 - before, 'b');
+      text += seam;
+      for (const std::string_view behind : {"b", "é", "\x80"}) {
+        expectAllAlike(text + std::string(behind) + std::string(70, 'b'));
+        expectAllAlike(text + std::string(behind));
+      }
+    }
+  }
+}
+
+// Texts of every mixture with a few bytes changed, most of which is no text any more.
+TEST(Widening, ChangedTextsAreRefusedAlike) {
+  const std::string_view characters[] = {"a", "é", "€", "\U0001D11E", "\uFFFD", "\uD7FF"};
+  std::mt19937 random(12);
+  unsigned refused = 0;
+  for (unsigned count = 0; count < 4000; ++count) {
+    std::string text;
+    const size_t kinds = 1 + random() % std::size(characters);
+    const size_t wanted = random() % 300;
+    while (text.size() < wanted) text += characters[random() % kinds];
+    for (size_t changes = text.empty() ? 0 : random() % 3; changes; --changes) {
+      text[random() % text.size()] = static_cast<char>(random() % 4 ? 0x80 | random() : random());
+    }
+    refused += widenedAll(widenSomePlainly, text) == u"none";
+    expectAllAlike(text);
+  }
+  EXPECT_GT(refused, 1000U);
+  EXPECT_LT(refused, 3000U);
 }
 
 // Each pair of halves that the tables know, in the middle of a text and at its end.
@@ -95,8 +139,8 @@ TEST(Widening, WhatIsNoTextIsRefusedWhereverItStands) {
         text += static_cast<char>(0x80 + third % 0x40);
         const Widened plain = widenSomePlainly(text, std::u16string(4, u'\0').data());
         refused += plain.bytes < text.size();
-        expectBothAlike(text);
-        expectBothAlike(around + text + around + around + around + around);
+        expectAllAlike(text);
+        expectAllAlike(around + text + around + around + around + around);
       }
     }
   }
@@ -107,11 +151,15 @@ TEST(Widening, AFaultIsFoundAtEveryPlace) {
   const std::string_view faults[] = {"\x80",         "\xC3",         "\xE2\x82",
                                      "\xF0\x9F\x98", "\xEF\xBF\xBE", "\xED\xA0\x80"};
   for (const std::string_view fault : faults) {
-    std::string text(200, 'a');
-    for (size_t at = 0; at <= text.size(); ++at) {
-      std::string changed = text;
-      changed.insert(at, fault);
-      EXPECT_EQ(widenedAll(widenSome, changed), u"none") << at;
+    for (const std::string_view around : {"a", "é", "€", "\U0001D11E"}) {
+      std::string text;
+      while (text.size() < 150) text += around;
+      for (size_t at = 0; at <= text.size(); at += around.size()) {
+        std::string changed = text;
+        changed.insert(at, fault);
+        EXPECT_EQ(widenedAll(widenSome, changed), u"none") << at;
+        expectAllAlike(changed);
+      }
     }
   }
 }
