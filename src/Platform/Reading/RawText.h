@@ -48,8 +48,9 @@ class RawTexts {
  private:
   using Append = void (*)(std::string_view bytes, ValueText<char>& text);
   ReadText standingFor(const RawText& text, Append append) {
-    const ReadText known = written(text.bytes(), text.wide);
-    return text.isPlain ? known : replaced(known, append);
+    // Nothing is copied where there is nothing to replace.
+    if (text.isPlain) return written(text.bytes(), text.wide);
+    return replaced(written(text.bytes(), text.wide), append);
   }
   ReadText replaced(const ReadText& known, Append append);
   // Whether the text, of one byte at least, begins with what goes on with a character.

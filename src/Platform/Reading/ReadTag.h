@@ -23,10 +23,14 @@ struct ReadTag {
     attributes.clear();
     declares = hasScope = false;
   }
-  void add(const ReadAttribute& attribute) {
-    if (attribute.name->declares) declares = true;
-    if (attribute.name->declares || attribute.name->isOfXML) hasScope = true;
-    attributes.push_back(attribute);
+  // The value is for the caller to fill in, where it is: a copy of what has just been written in
+  // parts would have to wait for them.
+  RawText& add(ReadName* name) {
+    if (name->declares) declares = true;
+    if (name->declares || name->isOfXML) hasScope = true;
+    ReadAttribute& added = attributes.emplace_back();
+    added.name = name;
+    return added.value;
   }
   // What it declares goes into the tree, below the element that is open there.
   void addNamespaces(ReadTree& tree, ReadNames& names) const {

@@ -16,6 +16,8 @@ namespace {
 
 // Of a longer text it is counted first what it comes to.
 constexpr size_t longestWidened = size_t{1} << 16;
+// A longer text surely lies apart from its node: a unit takes no more than three bytes.
+constexpr size_t longestBehind = 3 * NSXMLTreeBuilder::longestTextBehind / sizeof(char16_t);
 constexpr const char* notText = "a text is not well formed";
 
 void checkLength(size_t count) {
@@ -66,6 +68,9 @@ auto ReadTree::withStorable(const ReadText& text, Add add) {
     return add(NSStringView::ascii(text.bytes));
   }
   if (text.bytes.size() > longestWidened) return add(storedAlone(text.bytes));
+  if (text.bytes.size() > longestBehind) {
+    if (const NSStringView* const stored = storedInHand(text.bytes)) return add(stored);
+  }
   return add(widened(text.bytes));
 }
 
@@ -74,6 +79,15 @@ NSStringView ReadTree::widened(std::string_view text) {
   const char16_t* const end = widenXML(text, _units.data());
   if (!end) throw LibXMLStop{notText};
   return {_units.data(), static_cast<uint32_t>(end - _units.data())};
+}
+
+// Widened where it stays; null if there is no room in hand.
+const NSStringView* ReadTree::storedInHand(std::string_view text) {
+  char16_t* const units = _builder.unitsInHand(text.size());
+  if (!units) return nullptr;
+  const char16_t* const end = widenXML(text, units);
+  if (!end) throw LibXMLStop{notText};
+  return _builder.storeUnitsInHand(static_cast<size_t>(end - units));
 }
 
 const NSStringView* ReadTree::storedAlone(std::string_view text) {

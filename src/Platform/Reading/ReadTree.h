@@ -86,6 +86,7 @@ class ReadTree {
   auto withStorable(const ReadText& text, Add add);
   NSStringView widened(std::string_view text);
   void checkWide(std::string_view text);
+  const NSStringView* storedInHand(std::string_view text);
   const NSStringView* storedAlone(std::string_view text);
   void endSpaceChange();
   void hearSpace(const NSXMLName* name, std::string_view value);

@@ -318,15 +318,12 @@ const char* XMLReader::readEquals(const char* at) const {
 }
 
 const char* XMLReader::readAttribute(const char* at) {
-  ReadAttribute attribute = {readName(at), {}, {}};
-  if (!attribute.name) return nullptr;
+  ReadName* const name = readName(at);
+  if (!name) return nullptr;
   at = readEquals(at);
   if (!at) return nullptr;
   take(*at == '"' || *at == '\'');
-  at = readValue(at + 1, *at, attribute.value);
-  if (!at) return nullptr;
-  _tag.add(attribute);
-  return at;
+  return readValue(at + 1, *at, _tag.add(name));
 }
 
 const char* XMLReader::readValue(const char* at, char quote, RawText& value) {

@@ -89,6 +89,11 @@ const NSStringView* NSXMLTreeBuilder::storeFilled(NSStringView text) {
   return ::new (takeRoom(sizeof(NSStringView))) NSStringView(text);
 }
 
+const NSStringView* NSXMLTreeBuilder::storeUnitsInHand(size_t count) {
+  const char16_t* const units = roomForUnits(count);
+  return storeFilled({units, static_cast<uint32_t>(count)});
+}
+
 const NSStringView* NSXMLTreeBuilder::store(NSStringView text) {
   return withUnitsOf(text, [this](auto units) {
     using Unit = typename decltype(units)::value_type;

@@ -42,6 +42,13 @@ class NSXMLTreeBuilder {
   // Room for so many units of a text, for the caller to fill.
   char16_t* roomForUnits(size_t count);
   const NSStringView* storeFilled(NSStringView text);
+  // Room for as many units, of which the caller may fill fewer; null where it would have to be
+  // made. It is taken by storing what is there, before anything else is.
+  char16_t* unitsInHand(size_t most) const;
+  const NSStringView* storeUnitsInHand(size_t count);
+
+  // In bytes: a longer one lies apart from its node. Most texts are shorter.
+  static constexpr size_t longestTextBehind = 128;
 
   // A text that stays where it is when its builder goes back.
   const NSStringView* storeLasting(NSStringView text);
@@ -79,9 +86,6 @@ class NSXMLTreeBuilder {
   [[nodiscard]] NSXMLNode* finish();
 
  private:
-  // Most texts are shorter.
-  static constexpr size_t longestTextBehind = 128;
-
   static size_t bytesOf(NSStringView text) {
     return size_t{text.length()} << static_cast<int>(text.isWide());
   }
@@ -141,6 +145,11 @@ class NSXMLTreeBuilder {
 };
 
 // --- how ---------------------------------------------------------------------------------------
+
+inline char16_t* NSXMLTreeBuilder::unitsInHand(size_t most) const {
+  const auto room = static_cast<size_t>(_textEnd - _textCursor) / sizeof(char16_t);
+  return room < most ? nullptr : reinterpret_cast<char16_t*>(_textCursor);
+}
 
 inline void NSXMLTreeBuilder::append(NSXMLNode* child) {
   if (!_current) {
