@@ -77,7 +77,11 @@ void unreserve(char* begin, char* end) {
 
 // --- the range -------------------------------------------------------------------------------
 
-RangeRuns::RangeRuns(size_t mostBytes) {
+int RangeRuns::adviseSystem(void* begin, size_t bytes, int advice) noexcept {
+  return ::madvise(begin, bytes, advice);
+}
+
+RangeRuns::RangeRuns(size_t mostBytes, Advise advise) : _advise(advise) {
   reserve(std::min(mostBytes, windowBytes));
 }
 
@@ -125,7 +129,7 @@ bool RangeRuns::makeUsable(char* end) {
     if (::mprotect(before, bytes, PROT_READ | PROT_WRITE) != 0) continue;
     _usableEnd = wanted;
     char* const large = std::max(before, _begin + smallPagesBytes);
-    if (large < wanted) ::madvise(large, static_cast<size_t>(wanted - large), MADV_HUGEPAGE);
+    if (large < wanted) _advise(large, static_cast<size_t>(wanted - large), MADV_HUGEPAGE);
     return true;
   }
   return false;
@@ -134,13 +138,13 @@ bool RangeRuns::makeUsable(char* end) {
 void RangeRuns::giveBack(char* begin, char* end) {
   begin = roundedUp(begin, pageBytes);
   end = roundedDown(end, pageBytes);
-  if (begin < end) ::madvise(begin, static_cast<size_t>(end - begin), MADV_DONTNEED);
+  if (begin < end) _advise(begin, static_cast<size_t>(end - begin), MADV_DONTNEED);
 }
 
 // Where the system does not take offers, the pages go back at once.
 void RangeRuns::offer(char* begin, char* end) {
   if (begin >= end) return;
-  if (::madvise(begin, static_cast<size_t>(end - begin), MADV_FREE) != 0) giveBack(begin, end);
+  if (_advise(begin, static_cast<size_t>(end - begin), MADV_FREE) != 0) giveBack(begin, end);
 }
 
 void RangeRuns::giveBackIdle() noexcept {

@@ -39,7 +39,9 @@ class RangeRuns {
     Block* next;
   };
 
-  explicit RangeRuns(size_t mostBytes);
+  // What the system is told about pages goes through `advise`, which is madvise or a test's.
+  using Advise = int (*)(void* begin, size_t bytes, int advice) noexcept;
+  explicit RangeRuns(size_t mostBytes, Advise advise = adviseSystem);
   ~RangeRuns();
   RangeRuns(const RangeRuns&) = delete;
   RangeRuns& operator=(const RangeRuns&) = delete;
@@ -100,6 +102,8 @@ class RangeRuns {
   static Run* runOf(void* block) { return static_cast<Run*>(block) - 1; }
   static const Run* runOf(const void* block) { return static_cast<const Run*>(block) - 1; }
 
+  static int adviseSystem(void* begin, size_t bytes, int advice) noexcept;
+
   void reserve(size_t bytes);
   bool makeUsable(char* end);
   static size_t binOf(size_t units);
@@ -128,6 +132,7 @@ class RangeRuns {
   void giveBack(char* begin, char* end);
   void offer(char* begin, char* end);
 
+  const Advise _advise;
   std::mutex _mutex;
   char* _begin = nullptr;
   size_t _size = 0;

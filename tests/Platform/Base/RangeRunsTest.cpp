@@ -177,14 +177,41 @@ size_t offeredBytesAround(const char* address) {
   return 0;
 }
 
-// The system may have taken them already.
+// What the system was told since it was last asked for.
+struct Advised {
+  const char* begin;
+  size_t bytes;
+  int advice;
+};
+std::vector<Advised> advised;
+
+int adviseAndNote(void* begin, size_t bytes, int advice) noexcept {
+  advised.push_back({static_cast<const char*>(begin), bytes, advice});
+  return ::madvise(begin, bytes, advice);
+}
+int refuseOffers(void* begin, size_t bytes, int advice) noexcept {
+  advised.push_back({static_cast<const char*>(begin), bytes, advice});
+  return advice == MADV_FREE ? -1 : ::madvise(begin, bytes, advice);
+}
+
+// Of a block, without what shares a large page with something else.
+size_t advisedBytes(int advice, const char* begin, size_t bytes) {
+  size_t sum = 0;
+  for (const Advised& each : advised) {
+    const char* const from = std::max(begin, each.begin);
+    const char* const to = std::min(begin + bytes, each.begin + each.bytes);
+    if (each.advice == advice && from < to) sum += static_cast<size_t>(to - from);
+  }
+  return sum;
+}
+
 void expectOffered(const char* begin, size_t bytes) {
-  if (!isInMemory(begin + bytes / 2)) return;
-  EXPECT_GT(offeredBytesAround(begin), 0u);
+  EXPECT_GT(advisedBytes(MADV_FREE, begin, bytes), bytes - 4 * mebibyte);
+  EXPECT_EQ(advisedBytes(MADV_DONTNEED, begin, bytes), 0u) << "they are not given back at once";
 }
 
 TEST(RangeRuns, LargeBlocksAreOfferedToTheSystemAndGoBackWithOthersOnRequest) {
-  RangeRuns runs(256 * mebibyte);
+  RangeRuns runs(256 * mebibyte, adviseAndNote);
   for (const bool isLarge : {true, false}) {
     const size_t bytes = isLarge ? 60 * mebibyte : 20 * mebibyte;
     auto* const block = static_cast<char*>(runs.take(bytes));
@@ -192,17 +219,33 @@ TEST(RangeRuns, LargeBlocksAreOfferedToTheSystemAndGoBackWithOthersOnRequest) {
     std::memset(block, 1, bytes);
     EXPECT_TRUE(isInMemory(block + bytes / 2));
     EXPECT_EQ(offeredBytesAround(block), 0u);
+    advised.clear();
     runs.give(block);
     if (isLarge) {
       expectOffered(block, bytes);
     } else {
+      EXPECT_TRUE(advised.empty());
       EXPECT_TRUE(isInMemory(block + bytes / 2));
-      EXPECT_EQ(offeredBytesAround(block), 0u);
     }
     runs.giveBackIdle();
+    EXPECT_GT(advisedBytes(MADV_DONTNEED, block, bytes), bytes - mebibyte);
     EXPECT_FALSE(isInMemory(block + bytes / 2));
     runs.give(after);
   }
+}
+
+// A system that knows no offers.
+TEST(RangeRuns, WhatCannotBeOfferedGoesBackAtOnce) {
+  RangeRuns runs(256 * mebibyte, refuseOffers);
+  constexpr size_t bytes = 60 * mebibyte;
+  auto* const block = static_cast<char*>(runs.take(bytes));
+  void* const after = runs.take(100);
+  std::memset(block, 1, bytes);
+  advised.clear();
+  runs.give(block);
+  EXPECT_GT(advisedBytes(MADV_DONTNEED, block, bytes), bytes - 4 * mebibyte);
+  EXPECT_FALSE(isInMemory(block + bytes / 2));
+  runs.give(after);
 }
 
 // Whoever takes it next finds room that stays its own.
@@ -225,7 +268,7 @@ TEST(RangeRuns, WhatWasOfferedIsTakenAgain) {
 // What shares a large page with something that is in use is not offered, so that the page remains
 // one.
 TEST(RangeRuns, LargePagesAreOfferedAsAWhole) {
-  RangeRuns runs(256 * mebibyte);
+  RangeRuns runs(256 * mebibyte, adviseAndNote);
   std::vector<void*> blocks;
   for (int count = 0; count < 100; ++count) {
     blocks.push_back(runs.take(mebibyte));
@@ -233,10 +276,18 @@ TEST(RangeRuns, LargePagesAreOfferedAsAWhole) {
   }
   auto* const used = static_cast<char*>(runs.take(100));
   void* const larger = runs.take(60 * mebibyte);
+  advised.clear();
   for (void* const block : blocks) runs.give(block);
   runs.give(larger);  // whose room is that of what is kept
   expectOffered(static_cast<char*>(blocks[0]), 60 * mebibyte);
-  EXPECT_TRUE(isInMemory(used - reinterpret_cast<uintptr_t>(used) % (2 * mebibyte)));
+  constexpr size_t largePage = 2 * mebibyte;
+  for (const Advised& each : advised) {
+    EXPECT_EQ(reinterpret_cast<uintptr_t>(each.begin) % largePage, 0u);
+    EXPECT_EQ(each.bytes % largePage, 0u);
+  }
+  const char* const page = used - reinterpret_cast<uintptr_t>(used) % largePage;
+  EXPECT_EQ(advisedBytes(MADV_FREE, page, largePage), 0u) << "something in it is in use";
+  EXPECT_TRUE(isInMemory(page));
 }
 
 TEST(RangeRuns, ThreadsMayTakeAndGiveAtOnce) {
