@@ -15,6 +15,11 @@ namespace {
 
 constexpr size_t smallestTable = 16;
 
+// Of an element, without a call for each.
+const NSXMLName* nameOf(const NSXMLNode* element) {
+  return NSXMLTree::nameOf(const_cast<NSXMLElement*>(static_cast<const NSXMLElement*>(element)));
+}
+
 }  // namespace
 
 size_t NSXMLNameIndex::placeOf(const NSXMLIndexList<Name>& table, const NSXMLExpandedName* name) {
@@ -31,18 +36,16 @@ size_t NSXMLNameIndex::placeOf(const NSXMLIndexList<Name>& table, const NSXMLExp
 class NSXMLNameIndex::Maker {
  public:
   explicit Maker(uint32_t mostNodes, bool hasWays = true)
-      : _table(smallestTable), _hasWays(hasWays) {
+      : _table(placesPerWay * smallestTable), _hasWays(hasWays) {
     _arrived.reserve(mostNodes);
     _wayOf.reserve(mostNodes);
     _ways.emplace_back();
   }
 
   // Answers its way.
-  uint32_t add(const NSXMLNode* node, uint32_t above) {
-    const NSXMLName* const written = node->nodeName();
-    size_t place = placeOf(_table, _hasWays ? above : 0, written);
-    if (!_table[place].way) place = addWay(node, written, above);
-    const uint32_t way = _table[place].way;
+  uint32_t add(const NSXMLNode* node, const NSXMLName* written, uint32_t above) {
+    uint32_t way = _table[placeOf(_hasWays ? above : 0, written)];
+    if (!way) way = addWay(node, written, above);
     ++_ways[way].count;
     _wayOf.push_back(way);
     _arrived.push_back(node);
@@ -62,46 +65,46 @@ class NSXMLNameIndex::Maker {
   std::unique_ptr<const NSXMLNameIndex> index();
 
  private:
-  struct Place {
-    const NSXMLName* written = nullptr;
-    uint32_t above = 0;
-    uint32_t way = 0;  // 0 for none
-  };
-
-  static size_t placeOf(const NSXMLIndexList<Place>& table, uint32_t above,
-                        const NSXMLName* written) {
+  // The place of the way, or the empty one where it belongs.
+  size_t placeOf(uint32_t above, const NSXMLName* written) const {
     constexpr uint64_t mix = 0x9E3779B97F4A7C15;
-    const size_t mask = table.size() - 1;
+    const size_t mask = _table.size() - 1;
     const uint64_t key = (reinterpret_cast<uintptr_t>(written) >> 3) + (uint64_t{above} << 32);
     size_t place = (key * mix >> 32) & mask;
-    while (table[place].way && (table[place].written != written || table[place].above != above)) {
+    while (const uint32_t way = _table[place]) {
+      if (_ways[way].name == written && _ways[way].above == above) break;
       place = (place + 1) & mask;
     }
     return place;
   }
-  size_t addWay(const NSXMLNode* node, const NSXMLName* written, uint32_t above) {
-    if (_hasWays && _ways.size() > mostWays) {
-      _hasWays = false;
-      for (Way& each : _ways) each.above = 0;
-    }
+  uint32_t addWay(const NSXMLNode* node, const NSXMLName* written, uint32_t above) {
+    if (_hasWays && _ways.size() > mostWays) loseWays();
     if (!_hasWays) above = 0;
-    if (2 * (_ways.size() + 1) > _table.size()) grow();
-    const size_t place = placeOf(_table, above, written);
+    if (placesPerWay * (_ways.size() + 1) > _table.size()) grow();
+    const size_t place = placeOf(above, written);
     // There may be one by now, as that of a name alone.
-    if (_table[place].way) return place;
+    if (_table[place]) return _table[place];
     const auto way = static_cast<uint32_t>(_ways.size());
-    _table[place] = {written, above, way};
+    _table[place] = way;
     _ways.push_back({written, node, above, 0, 0, _ways[above].below, false});
     _ways[above].below = way;
-    return place;
+    return way;
+  }
+  void loseWays() {
+    _hasWays = false;
+    for (Way& each : _ways) each.above = 0;
+    enterWays();
   }
   void grow() {
-    NSXMLIndexList<Place> old(2 * _table.size());
-    old.swap(_table);
+    NSXMLIndexList<uint32_t>(2 * _table.size()).swap(_table);
+    enterWays();
+  }
+  void enterWays() {
+    std::fill(_table.begin(), _table.end(), 0);
     WorkPacer pacer;
-    for (const Place& each : old) {
+    for (uint32_t way = 1; way < _ways.size(); ++way) {
       pacer.turn();
-      if (each.way) _table[placeOf(_table, each.above, each.written)] = each;
+      _table[placeOf(_ways[way].above, _ways[way].name)] = way;
     }
   }
   static void growNames(NSXMLIndexList<Name>& table) {
@@ -119,7 +122,10 @@ class NSXMLNameIndex::Maker {
     return _hasWays && _ways.size() * sizeof(Way) <= _arrived.size() * sizeof(NSXMLNodePlace);
   }
 
-  NSXMLIndexList<Place> _table;  // 2^n places, at most half of them taken
+  // 2^n places, each with a way or 0. So few of them are taken that the first one tried is nearly
+  // always the one: which it is nobody could foresee.
+  static constexpr size_t placesPerWay = 8;
+  NSXMLIndexList<uint32_t> _table;
   NSXMLIndexList<Way> _ways;
   bool _hasWays;
   bool _hasInstructions = false;
@@ -191,7 +197,7 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofElements(const NSXMLNode
     pacer.turn();
     uint32_t way = above;
     if (node->kind() == Kind::Element) {
-      way = maker.add(node, above);
+      way = maker.add(node, nameOf(node), above);
     } else if (node->kind() == Kind::ProcessingInstruction) {
       maker.addInstruction();
     }
@@ -230,7 +236,7 @@ std::unique_ptr<const NSXMLNameIndex> NSXMLNameIndex::ofAttributes(const NSXMLNo
     for (const NSXMLNode* attribute = element->firstAttribute(); attribute;
          attribute = NSXMLElement::nextAttribute(attribute)) {
       pacer.turn();
-      maker.add(attribute, 0);
+      maker.add(attribute, attribute->nodeName(), 0);
     }
   }
   return maker.index();
