@@ -5,6 +5,7 @@
 #include "Median.h"
 #include "OtherReaders.h"
 #include "PeakMemory.h"
+#include "PlainNodes.h"
 #include "ReadingTexts.h"
 
 #include <chrono>
@@ -70,6 +71,23 @@ std::vector<double> timesOf(const std::string& xml) {
   return medians;
 }
 
+// Of `count(//node())` beside a walk through as many nodes of 56 bytes, round by round.
+double countOverPlainCount(NSXMLDocument& document, size_t nodes) {
+  const auto query = compile("count(//node())");
+  const auto context = XQueryContext::xqueryContext();
+  const PlainNodes plain(&document);
+  std::vector<double> ours;
+  std::vector<double> plains;
+  size_t found = plain.count();
+  if (found + 1 != nodes) throw std::runtime_error("a document of another shape");
+  for (int round = 0; round < rounds; round++) {
+    ours.push_back(milliseconds([&] { evaluate(*context, *query, Value(&document)); }));
+    plains.push_back(milliseconds([&] { found += plain.count(); }));
+  }
+  if (found != (rounds + 1) * (nodes - 1)) throw std::runtime_error("a walk that changed");
+  return median(ours) / median(plains);
+}
+
 void report(const Text& text, double factor) {
   const std::string xml = text.generate(factor);
   XQueryReleaseIdleMemory();
@@ -84,23 +102,24 @@ void report(const Text& text, double factor) {
       for (const NSXMLNode* node = document.get(); node; node = node->nextNode()) nodes++;
     }));
   }
+  const double counting = countOverPlainCount(*document, nodes);
   document = nullptr;
   const std::vector<double> times = timesOf(xml);
-  std::printf("%-22s %7.1f %9.1f %9.2f %9.2f %9.2f %9.2f %9.2f %9.1f\n", text.kind,
+  std::printf("%-22s %7.1f %9.1f %9.2f %9.2f %9.2f %9.2f %9.2f %9.1f %9.2f\n", text.kind,
               static_cast<double>(xml.size()) / 1e6, times[0], times[1] / times[0],
               times[1] / times[3], times[2] / times[0], times[3] / times[0],
               bytes / static_cast<double>(xml.size()),
-              1e6 * median(walks) / static_cast<double>(nodes));
+              1e6 * median(walks) / static_cast<double>(nodes), counting);
   std::fflush(stdout);
 }
 
 }  // namespace
 
 int reportReading(double factor) {
-  std::printf("%-22s %7s %9s %9s %9s %9s %9s %9s %9s\n", "", "", "SAX", "engine", "engine",
-              "libxml2", "pugixml", "engine", "engine");
-  std::printf("%-22s %7s %9s %9s %9s %9s %9s %9s %9s\n", "text", "MB", "ms", "/ SAX", "/ pugixml",
-              "/ SAX", "/ SAX", "byte/byte", "ns/node");
+  std::printf("%-22s %7s %9s %9s %9s %9s %9s %9s %9s %9s\n", "", "", "SAX", "engine", "engine",
+              "libxml2", "pugixml", "engine", "engine", "count");
+  std::printf("%-22s %7s %9s %9s %9s %9s %9s %9s %9s %9s\n", "text", "MB", "ms", "/ SAX",
+              "/ pugixml", "/ SAX", "/ SAX", "byte/byte", "ns/node", "/ 56 B");
   for (const Text& text : texts) report(text, factor);
   return 0;
 }
