@@ -382,8 +382,9 @@ TEST(XMLReader, LongNamesAreLeft) {
 }
 
 TEST(XMLReader, LongTextsAreReadAlike) {
-  for (const size_t length : {size_t{16384}, size_t{70000}}) {
-    for (const char* unit : {"x", "\xC3\xA9", "&amp;", "\r\n"}) {
+  for (const size_t length : {190, 194, 200, 1000, 16384, 70000}) {
+    for (const char* unit :
+         {"x", "\xC3\xA9", "\xE2\x82\xAC", "\xF0\x9D\x84\x9E", "&amp;", "\r\n"}) {
       std::string content;
       while (content.size() < length) content += unit;
       const std::string text = "<a b='" + content + "'>" + content + "<![CDATA[" + content +
