@@ -93,14 +93,15 @@ class NSXMLNameIndex::Maker {
   void loseWays() {
     _hasWays = false;
     for (Way& each : _ways) each.above = 0;
+    std::fill(_table.begin(), _table.end(), 0);
     enterWays();
   }
   void grow() {
     NSXMLIndexList<uint32_t>(2 * _table.size()).swap(_table);
     enterWays();
   }
+  // Into a table of zeros.
   void enterWays() {
-    std::fill(_table.begin(), _table.end(), 0);
     WorkPacer pacer;
     for (uint32_t way = 1; way < _ways.size(); ++way) {
       pacer.turn();
