@@ -4,11 +4,12 @@ from __future__ import annotations
 
 import gc
 import io
+import os
 import sys
 import threading
 import time
 from pathlib import Path
-from typing import Callable, List, Optional
+from typing import Any, Callable, List, Optional
 
 import pytest
 
@@ -152,6 +153,34 @@ def test_documents_that_are_broken_or_missing(tmp_path: Path) -> None:
         query.stream("http://example.org/")
     with pytest.raises(TypeError):
         query.stream(1)  # type: ignore[arg-type]
+
+
+# By the library alone: who writes while nobody reads is ended.
+def test_a_named_pipe_is_opened_once(tmp_path: Path, monkeypatch: pytest.MonkeyPatch) -> None:
+    pipe = tmp_path / "pipe"
+    os.mkfifo(pipe)
+    plain = open
+
+    def refusing(file: Any, *arguments: Any, **named: Any) -> Any:
+        assert file != pipe
+        return plain(file, *arguments, **named)
+
+    monkeypatch.setattr("builtins.open", refusing)
+
+    def write() -> None:
+        with plain(pipe, "wb") as file:
+            file.write(b"<a><r>1</r><r>2</r></a>")
+
+    reads: List[Callable[[], List[str]]] = [
+        lambda: list(xquery.compile("for $r in /a/r return string($r)").stream(pipe)),
+        lambda: xquery.query("/a/r/string()", pipe).to_list(),
+    ]
+    for read in reads:
+        writer = threading.Thread(target=write, daemon=True)
+        writer.start()
+        assert read() == ["1", "2"]
+        writer.join(10)
+        assert not writer.is_alive()
 
 
 def test_what_reading_raises_is_raised() -> None:

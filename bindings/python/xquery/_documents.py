@@ -4,6 +4,7 @@ from __future__ import annotations
 
 import os
 import re
+import stat
 from typing import TYPE_CHECKING, List, Optional, Protocol, Union
 
 from . import _xquery
@@ -43,6 +44,13 @@ def _path(path: Union[str, os.PathLike[str]]) -> bytes:
     return b"./-" if name == b"-" else name
 
 
+def _try_to_open(path: Union[str, os.PathLike[str]]) -> None:
+    # Not a named pipe: who writes to it would find it closed.
+    if not stat.S_ISFIFO(os.stat(path).st_mode):
+        with open(path, "rb"):
+            pass
+
+
 def _is_text(source: str) -> bool:
     return source.lstrip("\ufeff \t\r\n").startswith("<")
 
@@ -68,8 +76,7 @@ def _from_file(
     except DocumentError as error:
         if error.place is None:
             # Python knows better what is wrong with a file that cannot be opened.
-            with open(path, "rb"):
-                pass
+            _try_to_open(path)
         raise
     url = _xquery.file_url(_path(path))
     if url is not None:

@@ -21,7 +21,7 @@ from typing import (
 )
 
 from . import _xquery
-from ._documents import Source, _path, _URL, _utf8, _is_text, parse
+from ._documents import Source, _is_text, _path, _try_to_open, _URL, _utf8, parse
 from ._errors import DocumentError, Error
 from ._settings import Loader, Missing, Modules, Policy, Settings, Trace
 from ._xquery import Cancellation, Node, Result
@@ -236,8 +236,7 @@ class Stream(Iterator[Any]):
             raise ValueError("a stream is read from a file: a URL has to be opened before")
         elif isinstance(source, (str, os.PathLike)):
             # So that what is wrong with it is known before the first item is asked for.
-            with open(source, "rb"):
-                pass
+            _try_to_open(source)
             path, name = _path(source), os.fspath(source)
         elif hasattr(source, "read"):
             read, name = _reader(source), str(getattr(source, "name", "document"))
