@@ -2,10 +2,13 @@
 
 from __future__ import annotations
 
+import math
 import threading
 import warnings
+from decimal import Decimal
+from fractions import Fraction
 from pathlib import Path
-from typing import Callable, List, Optional, Tuple, Union
+from typing import Any, Callable, Dict, List, Optional, Tuple, Union
 
 import pytest
 
@@ -221,3 +224,48 @@ def test_functions_must_be_callable() -> None:
     for name in ("loader", "trace", "missing"):
         with pytest.raises(TypeError, match=f"{name} is not callable"):
             xquery.compile("1", **{name: 1})  # type: ignore[arg-type]
+
+
+@pytest.mark.parametrize(
+    "settings, text",
+    [
+        ({"seconds": "x"}, "seconds must be a number, not str"),
+        ({"seconds": b"1"}, "seconds must be a number, not bytes"),
+        ({"memory": "1"}, "memory must be an int, not str"),
+        ({"memory": 1.5}, "memory must be an int, not float"),
+        ({"policy": "deny"}, "policy must be a Policy, not str"),
+        ({"url": 1}, "url must be a str, not int"),
+        ({"cancellation": True}, "cancellation must be a Cancellation, not bool"),
+        ({"namespaces": "p=u"}, "namespaces must be a mapping, not str"),
+        ({"namespaces": {"p": 1}}, "a prefix or a namespace must be a str, not int"),
+        ({"namespaces": {None: "u"}}, "a prefix or a namespace must be a str, not NoneType"),
+    ],
+)
+def test_settings_of_wrong_types(settings: Dict[str, Any], text: str) -> None:
+    takes: List[Callable[[], object]] = [
+        lambda: xquery.compile("1", **settings),
+        lambda: xquery.Context(**settings),
+    ]
+    for take in takes:
+        with pytest.raises(TypeError, match=f"^{text}$"):
+            take()
+
+
+def test_settings_that_are_numbers_of_any_type() -> None:
+    for seconds in (1, 2.5, Decimal("1.5"), Fraction(3, 2), True, 10**400, math.inf):
+        one = xquery.compile("1", seconds=seconds)  # type: ignore[arg-type]
+        assert one.evaluate().one() == 1
+    for seconds in (-1, -math.inf, math.nan, -(10**400)):
+        with pytest.raises(ValueError, match="^seconds must not be negative$"):
+            xquery.compile("1", seconds=seconds)
+    for memory in (10**6, 10**30):
+        assert xquery.compile("1", memory=memory).evaluate().one() == 1
+
+
+def test_prefixes_that_have_a_meaning_of_their_own() -> None:
+    for prefix in ("xml", "xmlns"):
+        with pytest.raises(ValueError, match=f"^prefix {prefix} can't be redeclared$"):
+            xquery.compile("1", namespaces={prefix: "u"})
+    reserved = {"p": "http://www.w3.org/XML/1998/namespace"}
+    query = xquery.compile("string(/a/@p:lang)", namespaces=reserved)
+    assert query.evaluate("<a xml:lang='de'/>").one() == "de"

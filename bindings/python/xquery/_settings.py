@@ -2,6 +2,8 @@
 
 from __future__ import annotations
 
+import math
+import operator
 import os
 from dataclasses import dataclass, fields
 from typing import (
@@ -121,18 +123,19 @@ class Settings:
 
     def made(self) -> _xquery.Settings:
         """The same for the library."""
-        if self.memory is not None and self.memory < 0:
-            raise ValueError("memory must not be negative")
+        _must_be("policy", Policy, "a Policy", self.policy)
+        _must_be("url", (str, type(None)), "a str", self.url)
+        _must_be("cancellation", (Cancellation, type(None)), "a Cancellation", self.cancellation)
         base = self.base()
         modules = self.modules
         if isinstance(modules, Mapping):
             modules = _found_in(modules, base)
         return _xquery.Settings(
-            seconds=self.seconds,
-            memory=None if self.memory is None else min(self.memory, 2**64 - 1),
+            seconds=None if self.seconds is None else _seconds(self.seconds),
+            memory=None if self.memory is None else _bytes(self.memory),
             policy=self.policy.rules,
             url=base,
-            namespaces=dict(self.namespaces or {}),
+            namespaces={} if self.namespaces is None else _namespaces(self.namespaces),
             cancellation=self.cancellation,
             loader=self.loader,
             modules=modules,
@@ -144,6 +147,40 @@ class Settings:
         """Those that are not what they are without being given."""
         values = ((field, getattr(self, field.name)) for field in fields(self))
         return {field.name: value for field, value in values if value != field.default}
+
+
+def _must_be(name: str, types: Any, expected: str, given: object) -> None:
+    if not isinstance(given, types):
+        raise TypeError(f"{name} must be {expected}, not {type(given).__name__}")
+
+
+def _seconds(given: float) -> float:
+    if not hasattr(given, "__float__") and not hasattr(given, "__index__"):
+        raise TypeError(f"seconds must be a number, not {type(given).__name__}")
+    try:
+        return float(given)
+    except OverflowError:
+        return math.inf if given > 0 else -math.inf
+
+
+def _bytes(given: int) -> int:
+    if not hasattr(given, "__index__"):
+        raise TypeError(f"memory must be an int, not {type(given).__name__}")
+    number = operator.index(given)
+    if number < 0:
+        raise ValueError("memory must not be negative")
+    return min(number, 2**64 - 1)
+
+
+def _namespaces(given: Mapping[str, str]) -> Dict[str, str]:
+    _must_be("namespaces", Mapping, "a mapping", given)
+    for text in (*given.keys(), *given.values()):
+        _must_be("a prefix or a namespace", str, "a str", text)
+    for prefix in ("xml", "xmlns"):
+        # As a prolog may not, which says so with these words.
+        if prefix in given:
+            raise ValueError(f"prefix {prefix} can't be redeclared")
+    return dict(given)
 
 
 def _working_folder() -> str:
