@@ -6,6 +6,8 @@
 
 namespace xquery {
 
+class XQueryListPart;
+
 // The comma operator, and any ordered list of sub-expressions.
 class XQueryExprList : public XQueryExpr {
  public:
@@ -36,6 +38,10 @@ class XQueryExprList : public XQueryExpr {
   friend Ref<T> make(Arguments&&...);
 
   SingleOrArray<XQueryExpr> _storage;
+
+ private:
+  // False after an error.
+  bool gather(XQueryListPart& part, XQueryContext& context) const;
 };
 
 // What stands in parentheses, however many; anything else, null included, is the answer itself.

@@ -1,8 +1,11 @@
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Evaluated.h"
+#include "Expr/ProbeExpr.h"
+#include "Expr/RandomChoices.h"
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Expr/XQuerySequence.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Prolog/XQueryModules.h"
 #include "Prolog/XQueryProlog.h"
 #include "Prolog/XQueryPrologItems.h"
@@ -15,6 +18,7 @@
 
 #include <functional>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -169,6 +173,108 @@ TEST_F(Leaves, EmptyArraysOfElementsAddNothingToTheList) {
   EXPECT_TRUE(isNull(evaluate(*list)));
   list->addObject(integer("1"));
   EXPECT_EQ(printed(evaluate(*list)), "1");
+}
+
+// --- lists within lists --------------------------------------------------------------------------
+
+// Arrays with what is in them.
+std::string shapeOf(const Value& value) {
+  const auto* array = dyn_cast<NSArray>(value);
+  if (!array) return isNull(value) ? "-" : printed(value);
+  std::string shape = "[";
+  for (const Value& element : array->objects()) shape += shapeOf(element);
+  return shape + "]";
+}
+
+// What a list answers by the rule: each list within it is a value of its own.
+Value valueByTheRule(const XQueryExpr& expr) {
+  const auto* list = dyn_cast<XQueryExprList>(&expr);
+  if (!list) return cast<XQueryLiteral>(&expr)->literalValue();
+  XQueryGatherer results;
+  for (size_t index = 0; index < list->count(); ++index) {
+    results.add(valueByTheRule(*list->objectAtIndex(index)));
+  }
+  return results.value();
+}
+
+// Arrays within arrays are what a host may hand in; a sequence is flat.
+Value anyValue(RandomChoices& random, int depth) {
+  const size_t choice = random.below(8);
+  if (choice < 3) return text(std::string(1, static_cast<char>('a' + random.below(26))));
+  if (choice < 4) return NSNull::null();
+  const auto array = choice < 5 ? Ref<NSArray>(XQuerySequence::sequence()) : NSArray::array();
+  for (size_t count = depth > 0 ? random.below(3) : 0; count > 0; --count) {
+    const Value element = anyValue(random, depth - 1);
+    const bool isItem = !isNull(element) && !isa<NSArray>(element);
+    if (choice >= 5 || isItem) array->objects().push_back(element);
+  }
+  return array;
+}
+
+Ref<XQueryExpr> anyList(RandomChoices& random, int depth) {
+  const auto list = XQueryExprList::exprList();
+  for (size_t count = random.below(4); count > 0; --count) {
+    if (depth > 0 && random.below(2) == 0) {
+      list->addObject(anyList(random, depth - 1));
+    } else {
+      list->addObject(XQueryLiteral::literalWithValue(anyValue(random, 3)));
+    }
+  }
+  return list;
+}
+
+TEST_F(Leaves, ListsWithinListsAnswerWhatTheirValuesWould) {
+  RandomChoices random(27);
+  size_t arrays = 0;
+  for (int turn = 0; turn < 20000; ++turn) {
+    const auto list = anyList(random, 4);
+    const Value expected = valueByTheRule(*list);
+    ASSERT_EQ(shapeOf(evaluate(*list)), shapeOf(expected)) << "turn " << turn;
+    arrays += isa<NSArray>(expected);
+  }
+  EXPECT_GT(arrays, 1000U);
+}
+
+TEST_F(Leaves, AListWithinAListAnswersTheArrayThatIsAllOfIt) {
+  const Value array = NSArray::arrayWithObjects({text("a"), text("b")});
+  const auto inner = XQueryExprList::exprList();
+  inner->addObject(emptyLiteral());
+  inner->addObject(XQueryLiteral::literalWithValue(array));
+  const auto list = XQueryExprList::exprList();
+  list->addObject(inner);
+  list->addObject(emptyLiteral());
+  EXPECT_EQ(evaluate(*list).get(), array.get());
+}
+
+TEST_F(Leaves, AnErrorInAListWithinAListEndsBoth) {
+  const auto inner = XQueryExprList::exprList();
+  inner->addObject(integer("1"));
+  inner->addObject(failing(6, "first"));
+  const auto list = XQueryExprList::exprList();
+  list->addObject(integer("0"));
+  list->addObject(inner);
+  list->addObject(failing(6, "second"));
+  EXPECT_EQ(failure(*list)->msg()->utf8(), "first");
+}
+
+// Each level of which would be copied as often as there are levels around it.
+TEST_F(Leaves, ListsWithinListsTakeTimeInProportionToTheirItems) {
+  constexpr int depth = 2000, width = 20;
+  const auto wide = XQueryExprList::exprList();
+  for (int item = 0; item < width; ++item) wide->addObject(integer("1"));
+  auto nested = XQueryExprList::exprList();
+  for (int level = 0; level < depth; ++level) {
+    const auto around = XQueryExprList::exprList();
+    around->addObject(wide);
+    around->addObject(nested);
+    nested = around;
+  }
+  constexpr int64_t plenty = int64_t{1} << 40;
+  workMeter.stepsLeft = plenty;
+  const Value value = evaluate(*nested);
+  EXPECT_EQ(cast<NSArray>(value)->count(), size_t{depth} * width);
+  const int64_t steps = plenty - std::exchange(workMeter.stepsLeft, WorkMeter::manySteps);
+  EXPECT_LT(steps, 4 * depth * width);
 }
 
 TEST_F(Leaves, ListBindsItsElementsInOrder) {

@@ -229,11 +229,7 @@ const XQueryOperatorExpr* XQueryOperatorExpr::rangeToCompareWith() const {
 }
 
 const XQueryOperatorExpr* XQueryOperatorExpr::rangeIn(const XQueryExpr* expr) {
-  while (const auto* list = dyn_cast<XQueryExprList>(expr)) {  // parentheses
-    if (list->count() != 1) return nullptr;
-    expr = list->objectAtIndex(0);
-  }
-  const auto* range = dyn_cast<XQueryOperatorExpr>(expr);
+  const auto* range = dyn_cast<XQueryOperatorExpr>(XQueryWithoutParentheses(expr));
   return range && range->_type == XQueryOperatorTo ? range : nullptr;
 }
 
