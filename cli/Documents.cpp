@@ -53,9 +53,13 @@ std::string readFile(const std::string& path, size_t mostBytes) {
 
 namespace {
 
-// A script's first line, which names the command to the system, is for the query a blank one.
+// A script's first line, which names the command to the system, is for the query a blank one. An
+// editor may have put a byte order mark before it.
 std::string withoutInterpreter(std::string text) {
-  if (text.starts_with("#!")) text.erase(0, std::min(text.find('\n'), text.size()));
+  const size_t start = text.starts_with(byteOrderMark) ? byteOrderMark.size() : 0;
+  if (std::string_view(text).substr(start).starts_with("#!")) {
+    text.erase(start, std::min(text.find_first_of("\r\n"), text.size()) - start);
+  }
   return text;
 }
 

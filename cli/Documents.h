@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace cli {
@@ -22,6 +23,9 @@ struct Failure {
 // The bytes of a file, or of standard input for "-"; throws Failure, also where there are more than
 // so many.
 std::string readFile(const std::string& path, size_t mostBytes);
+
+// What may stand before all of a text.
+constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
 
 // The query, as -e or its file gives it; throws Failure.
 xquery::Ref<xquery::NSString> queryText(const Options& options);

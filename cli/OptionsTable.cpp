@@ -101,6 +101,10 @@ void takeDocument(const OptionRow& row, const std::string& text, Options& option
 void takeNamespace(const OptionRow& row, const std::string& text, Options& options) {
   needText(row, text);
   const Binding binding = split(row, text);
+  // As a prolog may not, which says so with these words.
+  if (binding.name == "xml" || binding.name == "xmlns") {
+    throw WrongUsage(std::string(row.name) + ": prefix " + binding.name + " can't be redeclared");
+  }
   if (!binding.name.empty() && !isUnprefixedName(binding.name)) {
     refuse(row, "a prefix, \"=\" and a URI", text);
   }

@@ -298,6 +298,8 @@ void Session::load(std::string_view argument) {
   options.queryText = std::nullopt;
   std::string text;
   if (!reporting({}, [&] { text = queryText(options)->utf8(); })) return;
+  // What was declared before will stand before it.
+  if (text.starts_with(byteOrderMark)) text.erase(0, byteOrderMark.size());
   const SessionInput input = sessionInput(text);
   const bool isModule =
       !input.declarations.empty() &&

@@ -33,6 +33,7 @@ TEST(Query, MayComeFromStandardInput) {
   EXPECT_EQ(outcome.out, "4\n");
   EXPECT_THAT(xquery({"-"}, "#! x\n1 +").err, HasSubstr("line:2"));
   EXPECT_EQ(xquery({"-"}, "#!").status, 0);
+  EXPECT_EQ(xquery({"-"}, "#! x\r1 + 1\r").out, "2\n");
   const Outcome twice = xquery({"-", "-"}, "1");
   EXPECT_EQ(twice.status, 2);
   EXPECT_THAT(twice.err, HasSubstr("standard input can be read only once"));
@@ -47,6 +48,20 @@ TEST(Query, MayBeAScript) {
   const std::string good = directory.write("good", "#!" XQUERY_BINARY_DIR "/xquery\ncount(//book)");
   chmod(good.c_str(), 0755);
   EXPECT_EQ(command::start(good, {books()}).out, "4\n");
+}
+
+TEST(Query, MayBeginWithAByteOrderMark) {
+  EXPECT_EQ(xquery({"-"},
+                   "\xEF\xBB\xBF"
+                   "1 + 1")
+                .out,
+            "2\n");
+  EXPECT_EQ(xquery({"-"}, "\xEF\xBB\xBF#!/usr/bin/env xquery\n1 + 1").out, "2\n");
+  EXPECT_EQ(xquery({"-"}, "\xEF\xBB\xBF#!").status, 0);
+  EXPECT_THAT(xquery({"-"}, "\xEF\xBB\xBF#! x\n1 +").err, HasSubstr("line:2"));
+  // Only one, and only before anything else.
+  EXPECT_EQ(xquery({"-"}, "\xEF\xBB\xBF\xEF\xBB\xBF#! x\n1").status, 1);
+  EXPECT_EQ(xquery({"-"}, " #! x\n1").status, 1);
 }
 
 TEST(Query, MayBeEmptyButNotBinary) {
@@ -73,6 +88,22 @@ TEST(Query, FindsNamesWithoutPrefixInTheNamespaceThatIsGiven) {
   const std::string file = directory.write("d.xml", "<a xmlns='urn:x'><b>1</b></a>");
   EXPECT_EQ(xquery({"-e", "count(//b)", file}).out, "0\n");
   EXPECT_EQ(xquery({"--namespace", "=urn:x", "-e", "count(//b)", file}).out, "1\n");
+}
+
+TEST(Query, MayGiveAReservedNamespaceAnotherPrefixAsItsPrologMay) {
+  const char* const input = "<a xml:lang='de'/>";
+  EXPECT_EQ(xquery({"-e",
+                    "declare namespace p = 'http://www.w3.org/XML/1998/namespace'; "
+                    "string(/a/@p:lang)",
+                    "-"},
+                   input)
+                .out,
+            "de\n");
+  EXPECT_EQ(xquery({"--namespace", "p=http://www.w3.org/XML/1998/namespace", "-e",
+                    "string(/a/@p:lang)", "-"},
+                   input)
+                .out,
+            "de\n");
 }
 
 TEST(Query, ReadsDocumentsOfVariablesAsHTMLUnlessTheyAreNamedXML) {

@@ -318,6 +318,16 @@ TEST_F(Session, LoadsQueriesAndModules) {
   EXPECT_EQ(session->ask("$q"), "5\n");
   EXPECT_EQ(session->ask(":load " + module), "");
   EXPECT_EQ(session->ask("m:f()"), "of a module\n");
+  EXPECT_EQ(session->ask(":load " + write("marked.xq",
+                                          "\xEF\xBB\xBF"
+                                          "declare variable $r := 7; $r")),
+            "7\n");
+  EXPECT_EQ(session->ask("$r"), "7\n");
+  const std::string marked =
+      write("marked.xqm",
+            "\xEF\xBB\xBFmodule namespace n = 'urn:n'; declare function n:f() { 'marked' };");
+  EXPECT_EQ(session->ask(":load " + marked), "");
+  EXPECT_EQ(session->ask("n:f()"), "marked\n");
   write("data.xml", "<d>beside</d>");
   EXPECT_EQ(session->ask(":load " + write("beside.xq", "string(doc('data.xml'))")), "beside\n");
 }
