@@ -106,7 +106,6 @@ bool endsLinesWithReturns(std::string_view list) {
 // One with a zero in it has a zero behind each name.
 void addList(const Options& options, const std::string& list, std::vector<Input>& inputs) {
   constexpr size_t mostBytes = size_t{1} << 30;
-  constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
   const std::string text = readFile(list, mostBytes);
   std::string_view rest = text;
   const bool hasZeros = text.find('\0') != text.npos;
