@@ -2,6 +2,7 @@
 
 from __future__ import annotations
 
+import copy
 import gc
 import pickle
 from typing import Any
@@ -164,10 +165,32 @@ def test_an_iterator_keeps_the_tree() -> None:
 
 def test_a_copy_is_a_tree_of_its_own(books: xquery.Node) -> None:
     book = books.find("//book")
-    copy = book.copy()
-    assert copy != book
-    assert copy.parent is None
-    assert copy.xml() == book.xml()
+    copied = book.copy()
+    assert copied != book
+    assert copied.parent is None
+    assert copied.xml() == book.xml()
+
+
+def test_the_module_copy_keeps_nodes_as_they_are(books: xquery.Node) -> None:
+    book = books.find("//book")
+    assert copy.copy(book) is book
+    assert copy.deepcopy(book) is book
+    assert copy.deepcopy({"books": [book]}) == {"books": [book]}
+
+
+def test_arguments_of_wrong_types(books: xquery.Node) -> None:
+    with pytest.raises(TypeError, match="^a path is a str, not int$"):
+        books.find(1)  # type: ignore[arg-type]
+    with pytest.raises(TypeError, match="^a path is a str, not Query$"):
+        books.find_all(xquery.compile("//book"))  # type: ignore[arg-type]
+    with pytest.raises(TypeError, match="^the name of an attribute is a str, not bytes$"):
+        books[0].get(b"isbn")  # type: ignore[call-overload]
+    for index in ("0", slice(1), None, 0.0):
+        with pytest.raises(TypeError, match="^a child is asked for by an int, not by "):
+            books[index]  # type: ignore[index]
+    for index in (10**30, -(10**30), 2**63, -(2**63) - 1):
+        with pytest.raises(IndexError, match="^no such child$"):
+            books[index]
 
 
 def test_representation(books: xquery.Node) -> None:

@@ -2,6 +2,8 @@
 
 from __future__ import annotations
 
+import copy
+import pickle
 from collections.abc import Sequence
 
 import pytest
@@ -25,8 +27,13 @@ def test_indexes() -> None:
     for index in (10, -11):
         with pytest.raises(IndexError, match="10 items"):
             TEN[index]
-    with pytest.raises(TypeError):
-        TEN["a"]  # type: ignore[call-overload]
+    for far in (10**30, -(10**30), 2**63, -(2**63) - 1):
+        with pytest.raises(IndexError, match="^the result has 10 items$"):
+            TEN[far]
+    for wrong in ("a", 1.0, None):
+        with pytest.raises(TypeError, match="^an item is asked for by an int or a slice, not by "):
+            TEN[wrong]  # type: ignore[call-overload]
+    assert TEN[True] == 2
 
 
 @pytest.mark.parametrize("start", [None, -12, -3, 0, 2, 9, 12])
@@ -62,6 +69,38 @@ def test_index_and_count() -> None:
     assert items.count("a") == 2
     with pytest.raises(ValueError):
         items.index("a", 1, 2)
+
+
+@pytest.mark.parametrize("start", [0, 1, -1, -2, 3, 10**30, -(10**30), True])
+@pytest.mark.parametrize("stop", [3, 1, -1, 10**30, -(10**30)])
+def test_index_within_a_part_is_that_of_a_list(start: int, stop: int) -> None:
+    items = xquery.query("'a', 'b', 'a'")
+    for value in ("a", "b"):
+        try:
+            expected = items.to_list().index(value, start, stop)
+        except ValueError:
+            with pytest.raises(ValueError, match="^no such item$"):
+                items.index(value, start, stop)
+        else:
+            assert items.index(value, start, stop) == expected
+
+
+def test_index_within_nonsense() -> None:
+    with pytest.raises(TypeError, match="indices must be integers"):
+        TEN.index(1, "x")  # type: ignore[arg-type]
+    with pytest.raises(TypeError, match="indices must be integers"):
+        TEN.index(1, 0, "x")  # type: ignore[arg-type]
+
+
+def test_copies_are_the_same_result() -> None:
+    assert copy.copy(TEN) is TEN
+    assert copy.deepcopy([TEN])[0] is TEN
+
+
+def test_results_are_not_pickled() -> None:
+    with pytest.raises(TypeError, match="^a result cannot be pickled: send to_list()"):
+        pickle.dumps(TEN)
+    assert pickle.loads(pickle.dumps(TEN.to_list())) == TEN
 
 
 def test_first_and_one() -> None:

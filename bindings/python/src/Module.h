@@ -49,6 +49,13 @@ py::object toStrOrNone(const Ref<NSString>& text);
 // Raises ValueError for a str with a surrogate of its own.
 std::string fromStr(const py::handle& text);
 
+// The text of an argument; raises TypeError for what is no str, by what it should be.
+std::string fromArgument(const py::object& text, const char* what);
+
+// Which of so many an index means, one below 0 counting from the end; -1 for none of them. Raises
+// TypeError for what is no index, which begins with that text.
+Py_ssize_t placeAmong(Py_ssize_t count, const py::object& index, const char* expected);
+
 // What a function of Python's C interface answers: a reference of the caller's own, or null where
 // it has failed, which is raised.
 py::object steal(PyObject* object);

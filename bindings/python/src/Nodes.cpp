@@ -60,9 +60,10 @@ py::dict attributesOf(const Node& self) {
   return attributes;
 }
 
-py::object attributeNamed(const Node& self, const py::str& name, const py::object& otherwise) {
+py::object attributeNamed(const Node& self, const py::object& name, const py::object& otherwise) {
   const auto* element = dyn_cast<NSXMLElement>(static_cast<const NSObject*>(self.node.get()));
-  const Ref<NSString> text = NSString::stringWithUTF8(fromStr(name));
+  const Ref<NSString> text =
+      NSString::stringWithUTF8(fromArgument(name, "the name of an attribute"));
   const NSXMLNode* found = element && text ? element->attributeForName(text->view()) : nullptr;
   return found ? toStr(found->textView()) : otherwise;
 }
@@ -123,10 +124,10 @@ py::object nextOf(Walk& walk) {
   return nodeToPython(found);
 }
 
-py::object childAt(const Node& self, int64_t index) {
-  const int64_t count = self.node->childCount();
-  const int64_t place = index < 0 ? index + count : index;
-  if (place < 0 || place >= count) throw py::index_error("no such child");
+py::object childAt(const Node& self, const py::object& index) {
+  const auto count = static_cast<Py_ssize_t>(self.node->childCount());
+  const Py_ssize_t place = placeAmong(count, index, "a child is asked for by an int");
+  if (place < 0) throw py::index_error("no such child");
   return nodeToPython(self.node->childAtIndex(static_cast<uint32_t>(place)));
 }
 
@@ -193,6 +194,11 @@ auto comparing(Test test) {
     }
     return py::bool_(test(compare(self, other.cast<const Node&>())));
   };
+}
+
+// Copies of what does not change are the same object.
+py::object itself(const py::object& self, const py::args&) {
+  return self;
 }
 
 [[noreturn]] py::object refusePickling(const Node&, py::args) {
@@ -272,6 +278,7 @@ py::object nodeOrNone(const NSXMLNode* node) {
 constexpr const char* documentation = R"doc(A node of a document, or one that a query has made.
 
 Trees are not changed from Python, and any number of threads may read one. A node keeps its tree.
+What the module copy makes of a node is the node itself; copy() makes a tree of its own.
 Nodes are equal when they are the same one, and are ordered as in the document. Iterating gives the
 children; len() counts them, and a node is true whether it has some or not.
 
@@ -326,6 +333,8 @@ void addNodes(py::module_& module) {
   node.def("__getitem__", childAt);
   node.def("__str__", textOf);
   node.def("__repr__", representation);
+  node.def("__copy__", itself);
+  node.def("__deepcopy__", itself);
   node.def("__reduce_ex__", refusePickling);
 }
 

@@ -17,7 +17,7 @@ py::object nodeOrNone(const NSXMLNode* node);
 
 // The first item of what the path, any query, answers for the node, or all of them. Documents and
 // modules are not loaded.
-py::object findFirst(const Node& node, const py::str& path);
-py::object findAll(const Node& node, const py::str& path);
+py::object findFirst(const Node& node, const py::object& path);
+py::object findAll(const Node& node, const py::object& path);
 
 }  // namespace xquery::python

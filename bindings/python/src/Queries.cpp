@@ -217,12 +217,12 @@ Result evaluateProfiled(const Compiled& compiled, Profile& profile, const Settin
 // The paths that were asked for last, so that a loop that asks each node the same compiles once.
 constexpr size_t mostPaths = 256;
 
-const Ref<XQuery>& compiledPath(const py::str& path, const Settings& settings) {
+const Ref<XQuery>& compiledPath(const py::object& path, const Settings& settings) {
   static auto* known = new std::unordered_map<std::string, Ref<XQuery>>;
-  std::string text = fromStr(path);
+  std::string text = fromArgument(path, "a path");
   const auto found = known->find(text);
   if (found != known->end()) return found->second;
-  Ref<XQuery> query = compile(path, settings, "planned").query;
+  Ref<XQuery> query = compile(py::reinterpret_borrow<py::str>(path), settings, "planned").query;
   if (known->size() >= mostPaths) known->clear();
   return (*known)[std::move(text)] = std::move(query);
 }
@@ -239,7 +239,7 @@ const Settings& settingsOfPaths() {
   return *settings;
 }
 
-Result find(const Node& node, const py::str& path) {
+Result find(const Node& node, const py::object& path) {
   const Settings& settings = settingsOfPaths();
   // A reference of its own: another thread may make the list of paths empty meanwhile.
   const Ref<XQuery> query = compiledPath(path, settings);
@@ -249,12 +249,12 @@ Result find(const Node& node, const py::str& path) {
 
 }  // namespace
 
-py::object findFirst(const Node& node, const py::str& path) {
+py::object findFirst(const Node& node, const py::object& path) {
   const Result result = find(node, path);
   return result.count == 0 ? py::none() : toPython(*result.item(0));
 }
 
-py::object findAll(const Node& node, const py::str& path) {
+py::object findAll(const Node& node, const py::object& path) {
   return py::cast(find(node, path));
 }
 

@@ -27,11 +27,10 @@ py::object nextOf(ResultIterator& iterator) {
   return toPython(*iterator.result.item(iterator.next++));
 }
 
-py::object itemAt(const Result& self, Py_ssize_t index) {
-  const auto count = static_cast<Py_ssize_t>(self.count);
-  const Py_ssize_t place = index < 0 ? index + count : index;
-  if (place < 0 || place >= count)
-    throw py::index_error("the result has " + std::to_string(count) + " items");
+py::object itemAt(const Result& self, const py::object& index) {
+  const Py_ssize_t place = placeAmong(static_cast<Py_ssize_t>(self.count), index,
+                                      "an item is asked for by an int or a slice");
+  if (place < 0) throw py::index_error("the result has " + std::to_string(self.count) + " items");
   return toPython(*self.item(static_cast<size_t>(place)));
 }
 
@@ -83,16 +82,27 @@ size_t countOf(const Result& self, const py::object& value) {
   return count;
 }
 
-size_t indexOf(const Result& self, const py::object& value, Py_ssize_t start,
+size_t indexOf(const Result& self, const py::object& value, const py::object& start,
                const py::object& stop) {
-  py::slice range(
-      start, stop.is_none() ? static_cast<Py_ssize_t>(self.count) : stop.cast<Py_ssize_t>(), 1);
-  size_t from = 0, end = 0, step = 0, length = 0;
-  if (!range.compute(self.count, &from, &end, &step, &length)) throw py::error_already_set();
-  for (size_t index = from; index < from + length; ++index) {
-    if (toPython(*self.item(index)).equal(value)) return index;
+  const py::object range = steal(PySlice_New(start.ptr(), stop.ptr(), nullptr));
+  Py_ssize_t from = 0, end = 0, step = 0;
+  if (PySlice_Unpack(range.ptr(), &from, &end, &step) < 0) throw py::error_already_set();
+  PySlice_AdjustIndices(static_cast<Py_ssize_t>(self.count), &from, &end, step);
+  for (Py_ssize_t index = from; index < end; ++index) {
+    if (toPython(*self.item(static_cast<size_t>(index))).equal(value)) {
+      return static_cast<size_t>(index);
+    }
   }
   throw py::value_error("no such item");
+}
+
+// Results do not change.
+py::object itself(const py::object& self, const py::args&) {
+  return self;
+}
+
+[[noreturn]] py::object refusePickling(const Result&, const py::args&) {
+  throw py::type_error("a result cannot be pickled: send to_list(), and the xml() of nodes");
 }
 
 // Equal to another result, a list or a tuple of equal items.
@@ -152,12 +162,15 @@ void addResults(py::module_& module) {
            [](const ResultIterator& self) { return self.result.count - self.next; });
   py::class_<Result> result(module, "Result", py::is_final(), documentation);
   result.def("__len__", [](const Result& self) { return self.count; });
-  result.def("__getitem__", itemAt);
   result.def("__getitem__", sliceOf);
+  result.def("__getitem__", itemAt);
   result.def("__iter__", [](const Result& self) { return ResultIterator{self}; });
   result.def("__eq__", isEqual);
   result.attr("__hash__") = py::none();
   result.def("__repr__", representation);
+  result.def("__copy__", itself);
+  result.def("__deepcopy__", itself);
+  result.def("__reduce_ex__", refusePickling);
   result.def("index", indexOf, py::arg("value"), py::arg("start") = 0, py::arg("stop") = py::none(),
              "The place of the first item that equals the value; ValueError for none.");
   result.def("count", countOf, py::arg("value"), "How many items equal the value.");

@@ -34,6 +34,21 @@ py::object toStrOrNone(const Ref<NSString>& text) {
   return text ? toStr(text->view()) : py::none();
 }
 
+std::string fromArgument(const py::object& text, const char* what) {
+  if (PyUnicode_Check(text.ptr())) return fromStr(text);
+  throw py::type_error(std::string(what) + " is a str, not " + Py_TYPE(text.ptr())->tp_name);
+}
+
+Py_ssize_t placeAmong(Py_ssize_t count, const py::object& index, const char* expected) {
+  if (!PyIndex_Check(index.ptr())) {
+    throw py::type_error(std::string(expected) + ", not by " + Py_TYPE(index.ptr())->tp_name);
+  }
+  const Py_ssize_t number = PyNumber_AsSsize_t(index.ptr(), nullptr);  // the nearest there is
+  if (number == -1 && PyErr_Occurred()) throw py::error_already_set();
+  const Py_ssize_t place = number < 0 ? number + count : number;
+  return place >= 0 && place < count ? place : -1;
+}
+
 std::string fromStr(const py::handle& text) {
   Py_ssize_t size = 0;
   const char* utf8 = PyUnicode_AsUTF8AndSize(text.ptr(), &size);
