@@ -54,6 +54,21 @@ constexpr const char* conditions[] = {
     "J or xs:integer($s/price) = xs:integer($p/@id)",
     "J or xs:integer($p/@n) = 1",
     "$s/@by eq $p/@id or $s/to eq $p/@id",
+    "$s[to = $p/@id]",
+    "$s[to eq $p/@id]",
+    "$s[$p/@id = to]/price",
+    "$s[@by][to = $p/@id and @n < 20]",
+    "exists($s[to[. = $p/@id]])",
+    "$s/to[. = $p/@id]/..",
+    "$s[price > number($p/@id)]",
+    "$s[starts-with(@by, $p/@id)]",
+    "boolean($s[string(@by) = $p/@id][xs:integer(price) < 20])",
+    "not($s[to = $p/@id]) or $s[@by = $p/@id]",
+    "compare($s/@by, $p/@id) = 0",
+    "0 eq compare($s/to, $p/@id)",
+    "deep-equal(string($s/@by), string($p/@id))",
+    "number($s/price) - number($p/@id) = 0",
+    "0 = (number($p/@n) - count($s/to))",
 };
 
 std::string with(std::string text, const std::string& comparison) {
@@ -108,7 +123,15 @@ TEST(ConditionParts, AnswerAlikeInPredicates) {
     for (const std::string& path :
          {"//s[" + condition + "]/@n", "count(//s[" + condition + "])",
           "//s[@by][" + condition + "]/@n", "//s[" + condition + "][to = $p/@id]/@n",
-          "//s[" + condition + "][@by = '1' or to = '3']/@n", "(//s[" + condition + "])[1]/@n"}) {
+          "//s[" + condition + "][@by = '1' or to = '3']/@n", "(//s[" + condition + "])[1]/@n",
+          "for $s in //s return $s[" + condition + "]/@n",
+          "for $s in //s return $s[@by][" + condition + "]",
+          "for $s in //s return ($s[" + condition + "])",
+          "for $s in //s, $t in $s/to return $t/..[" + condition + "]/@n",
+          "for $s in //s order by xs:integer($s/price) return $s[" + condition + "]/@n",
+          "count(for $s in //s return $s[" + condition + "]/price)",
+          "some $s in //s satisfies $s[" + condition + "]",
+          "for $s in //s where $s[" + condition + "] return string($s/@n)"}) {
       sameBothWays("for $p in //p return <a>{" + path + "}</a>", market());
     }
   }
@@ -118,7 +141,8 @@ TEST(ConditionParts, PickItems) {
   const std::string loop = "for $p in //p, $s in //s where ";
   for (const std::string condition : conditions) {
     if (condition == "(J) = false()" || condition.starts_with("xs:integer") ||
-        condition == "J or xs:integer($p/@n) = 1") {
+        condition == "J or xs:integer($p/@n) = 1" ||
+        condition == "not($s[to = $p/@id]) or $s[@by = $p/@id]") {
       continue;  // nothing is left out, or an error would be asked for behind others
     }
     const std::string text = loop + with(condition, "$s/to = $p/@id") + " return $s";
@@ -126,7 +150,10 @@ TEST(ConditionParts, PickItems) {
   }
   for (const std::string text :
        {"for $p in //p, $s in //s let $b := $s/to = $p/@id where $b return $s",
-        "for $p in //p, $s in //s return if (not($s/to = $p/@id)) then () else $s"}) {
+        "for $p in //p, $s in //s return if (not($s/to = $p/@id)) then () else $s",
+        "for $p in //p, $s in //s return $s[to = $p/@id]",
+        "for $p in //p, $s in //s return ($s[@by][to = $p/@id]/price)",
+        "for $p in //p, $s in //s return $s/to[. = $p/@id]/.."}) {
     EXPECT_GE(choicesOf("for-joins", text), 1U) << text;
   }
   for (const std::string text :
@@ -140,9 +167,33 @@ TEST(ConditionParts, PickItems) {
         "for $p in //p, $s in //s where $s/to = $p/@id or $s/@n != $p/@id return $s",
         "for $p in //p, $s in //s where $s/to = $p/@id or error() return $s",
         "for $p in //p, $s in //s let $b := xs:integer($s/@n) = $p/@id where $b return $s",
-        "for $p in //p, $s in //s return if ($s/to = $p/@id) then () else $s"}) {
+        "for $p in //p, $s in //s return if ($s/to = $p/@id) then () else $s",
+        "for $p in //p, $s in //s return $s[1][to = $p/@id]",
+        "for $p in //p, $s in (//s, 1) return $s[. = $p/@id]",
+        "for $p in //p, $s in //s order by $s/price return $s[to = $p/@id]",
+        "for $p in //p, $s in //s where deep-equal($s/to, $p/@id) return $s",
+        "for $p in //p, $s in //s where compare($s/to, $p/@id) = 1 return $s",
+        "for $p in //p, $s in //s where $s/price - $p/@id = 0 return $s"}) {
     EXPECT_EQ(choicesOf("for-joins", text), 0U) << text;
   }
+}
+
+TEST(ConditionParts, FiltersOfOneItemAreFoundByValue) {
+  for (const char* text :
+       {"for $a in //a return $a[@x = '1']/b", "for $a in //a return ($a[b = 'u'])",
+        "for $a in //a return if ($a/@x = 'none') then $a else ()",
+        "for $a in //a where $a[@x = 'none'] return $a/b",
+        "for $a in //a return $a/b[. = 'u']/.."}) {
+    EXPECT_GE(choicesOf("values", text), 1U) << text;
+    sameBothWays(text, manyNames());
+  }
+  for (const char* text :
+       {"for $a in //a return if ($a/@x = '1') then () else $a",
+        "for $a in //a order by $a/@x return $a[@x = '1']", "for $a in //a return $a[@x != '1']"}) {
+    EXPECT_EQ(choicesOf("values", text), 0U) << text;
+    sameBothWays(text, manyNames());
+  }
+  EXPECT_LT(stepsOf("for $a in //a return $a[@x = 'none']/b"), 50);
 }
 
 TEST(ConditionParts, OneOfSeveralIsFoundInTables) {

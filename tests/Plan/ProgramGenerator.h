@@ -84,6 +84,7 @@ class ProgramGenerator {
   std::string many();
   std::string keyOf(const std::string& item);
   std::string match(const std::string& item);
+  std::string difference(const std::string& one, const std::string& other);
   std::string matches(const std::string& item);
   // The same in other words, perhaps with another condition.
   std::string phrased(const std::string& item);

@@ -40,11 +40,27 @@ std::string ProgramGenerator::match(const std::string& item) {
            keyOf("$w") + _random.oneOf(operators) + other + ")";
   }
   if (_random.below(8) == 0) return "starts-with(" + keyOf(item) + ", " + other + ")";
+  if (_random.below(10) == 0) return difference(keyOf(item), other);
   return _random.below(2) ? keyOf(item) + _random.oneOf(operators) + other
                           : other + _random.oneOf(operators) + keyOf(item);
 }
 
+std::string ProgramGenerator::difference(const std::string& one, const std::string& other) {
+  const std::string function = _random.oneOf({"string", "string", "number", "data", "zero-or-one"});
+  const auto both = [&](const std::string& between) {
+    return function + "(" + one + ")" + between + function + "(" + other + ")";
+  };
+  return _random.oneOf({"(compare(" + one + ", " + other + ") = 0)",
+                        "(0 eq compare(" + both(", ") + "))", "deep-equal(" + both(", ") + ")",
+                        "(" + both(" - ") + " = 0)"});
+}
+
 std::string ProgramGenerator::matches(const std::string& item) {
+  if (item != "." && _random.below(8) == 0) {
+    return item + "[" + match(".") + "]" +
+           _random.oneOf({"", "", "/@x", "[" + match(".") + "]", "/*[" + match(".") + "]"});
+  }
+
   if (_random.below(6) == 0) return twoMatches(item);
   std::string text = _random.below(3) ? match(item) : phrased(item);
   while (_random.below(3) == 0) {
@@ -121,6 +137,10 @@ std::string ProgramGenerator::joined(int depth) {
                   }
                   return clause + within("$v", [&] {
                            std::string rest = " where " + matches(_random.oneOf({"$u", "$v"}));
+                           if (_random.below(4) == 0) {
+                             return " return " + _random.oneOf({"$u", "$v"}) + "[" + match(".") +
+                                    "]" + _random.oneOf({"", "/@x", "[@y]"});
+                           }
                            return rest + " return " + (_random.below(2) ? "$v" : expr(depth - 1));
                          });
                 }) +

@@ -6,6 +6,7 @@
 #include "Expr/XQueryLeaves.h"
 #include "Expr/XQueryLists.h"
 #include "Functions/Boolean.h"
+#include "Functions/DeepEqual.h"
 #include "Functions/Sequence.h"
 #include "Functions/Substring.h"
 #include "Functions/XQueryFunctionCall.h"
@@ -184,49 +185,101 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfSome(XQueryPlaceID pl
   return found;
 }
 
-// "buyer[@person = ...]", which is true when there is such a node: a key for each buyer.
+// "buyer[@person = ...]" and "$s[buyer = ...]", which are true when there is such a node: a key for
+// each buyer, or for what "$s" holds.
 XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfPath(XQueryPlaceID place) const {
   XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, place);
-  if (!path || path->steps().empty()) return {};
-  XQueryFacts pathFacts;
-  if (!path->start()) {
-    pathFacts.deeds |= XQueryDeeds::ReadsItem;
-  } else {
-    const XQueryPlaceID start = _planning.program.part(place, XQueryRole::FirstStep);
-    if (start == XQueryNoPlace || !path->start()->predicates().empty()) return {};
-    pathFacts.addDeeds(facts(start));
-  }
-  const XQueryWalkedStep& last = path->steps().back();
+  if (!path) return {};
+  const XQueryStep* start = path->start();
+  const bool filtersStart = start && !start->predicates().empty();
+  if (!filtersStart && path->steps().empty()) return {};
   for (const XQueryWalkedStep& each : path->steps()) {
     if (each.isExpression() || each.testMayRaise) return {};
-    if (&each != &last && !each.step->predicates().empty()) return {};
   }
-  if (last.step->predicates().size() != 1) return {};
-  const auto places = XQueryPredicatesOf(_planning, place, last);
-  if (!XQueryPredicatesAreOfTruth(_planning, places)) return {};
-  const auto all = conjuncts(places.front());
-  if (all.empty()) return {};
-  XQueryJoinScope inner;
-  inner.isFocus = true;
-  Comparison found = operandsAt(all.front(), inner);
-  if (!found.key || found.relation.isValueComparison) return {};
-  pathFacts.addDeeds(XQueryFactsUpTo(_planning, place, *path, last));
-  pathFacts.addDeedsWithin(found.keyFacts);
-  found.isWhole = all.size() == 1;
-  found.keyPlace = XQueryNoPlace;
-  found.key = XQueryInnerKeys::exprWithPath(Ref<XQueryWalkedPath>(path), *last.step, found.key);
-  found.keyFacts = pathFacts;
-  const XQueryJoinReads reads = _scope.readsOf(pathFacts);
-  const XQueryJoinReads others = _scope.readsOf(found.probeFacts);
-  if (reads == XQueryJoinReads::Round && others == XQueryJoinReads::Item) {
-    if (!areOfRound(path->path(), pathFacts)) return {};
-    std::swap(found.key, found.probe);
-    std::swap(found.keyFacts, found.probeFacts);
-    found.relation.relation = XQueryMirrored(found.relation.relation);
-    return found;
+  return filtersStart ? comparisonOfStart(place, *path) : comparisonOfStep(place, *path);
+}
+
+// Where no node is left of what the path starts with, none is found from there.
+XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfStart(XQueryPlaceID place,
+                                                                 XQueryWalkedPath& path) const {
+  const XQueryStep& step = *path.start();
+  const XQueryPlaceID start = _planning.program.part(place, XQueryRole::FirstStep);
+  if (start == XQueryNoPlace || !facts(start).are(XQueryItems::Node)) return {};
+  const auto places = XQueryPredicatesOf(_planning, place, step, 0);
+  XQueryFacts before;
+  before.addDeeds(facts(start));
+  Comparison found = comparisonOfNodes(path, step, places, before, facts(start).most <= 1);
+  if (!path.steps().empty()) found.isWhole = false;
+  return found;
+}
+
+// The same of the first step with predicates.
+XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfStep(XQueryPlaceID place,
+                                                                XQueryWalkedPath& path) const {
+  XQueryFacts before;
+  if (!path.start()) {
+    before.deeds |= XQueryDeeds::ReadsItem;
+  } else {
+    const XQueryPlaceID start = _planning.program.part(place, XQueryRole::FirstStep);
+    if (start == XQueryNoPlace) return {};
+    before.addDeeds(facts(start));
   }
-  const bool isJoin = reads == XQueryJoinReads::Item && others == XQueryJoinReads::Round;
-  return isJoin ? found : Comparison();
+  const auto& steps = path.steps();
+  const auto step = std::find_if(steps.begin(), steps.end(), [](const XQueryWalkedStep& each) {
+    return !each.step->predicates().empty();
+  });
+  if (step == steps.end()) return {};
+  before.addDeeds(XQueryFactsUpTo(_planning, place, path, *step));
+  Comparison found = comparisonOfNodes(path, *step->step,
+                                       XQueryPredicatesOf(_planning, place, *step), before, false);
+  if (step + 1 != steps.end()) found.isWhole = false;
+  return found;
+}
+
+// One of the comparisons that the predicates of a step ask of its nodes, or of its only one; an
+// error in them drops a node. `before` is what finding the nodes reads and does.
+XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonOfNodes(
+    XQueryWalkedPath& path, const XQueryStep& step, const std::vector<XQueryPlaceID>& predicates,
+    const XQueryFacts& before, bool isOne) const {
+  if (!XQueryPredicatesAreOfTruth(_planning, predicates)) return {};
+  constexpr int mostLevels = 8;
+  if (_scope.level >= mostLevels) return {};
+  XQueryJoinScope scope;
+  scope.isFocus = true;
+  scope.level = _scope.level + 1;
+  const XQueryJoinSearch inner(_planning, scope, {});
+  for (const XQueryPlaceID predicate : predicates) {
+    const auto all = conjuncts(predicate);
+    for (const XQueryPlaceID each : all) {
+      Comparison found = inner.comparisonAt({each, false, each});
+      if (!found.key || (found.relation.isValueComparison && !isOne)) continue;
+      XQueryFacts ofKeys = before;
+      ofKeys.addDeedsWithin(found.keyFacts);
+      found.isWhole = found.isWhole && all.size() == 1 && predicates.size() == 1;
+      found.keyPlace = XQueryNoPlace;
+      found.key = XQueryInnerKeys::exprWithPath(Ref<XQueryWalkedPath>(&path), step, found.key);
+      found.keyFacts = ofKeys;
+      if (joinsWith(found, areOfRound(path.path(), ofKeys))) return found;
+    }
+  }
+  return {};
+}
+
+// Whether the comparison is one of the item with something of the round, its sides exchanged where
+// the keys are what the round has.
+bool XQueryJoinSearch::joinsWith(Comparison& found, bool mayExchange) const {
+  const XQueryJoinReads keys = _scope.readsOf(found.keyFacts);
+  const XQueryJoinReads probes = _scope.readsOf(found.probeFacts);
+  if (keys == XQueryJoinReads::Item && probes == XQueryJoinReads::Round) return true;
+  if (!mayExchange || found.relation.isPrefix || keys != XQueryJoinReads::Round ||
+      probes != XQueryJoinReads::Item) {
+    return false;
+  }
+  std::swap(found.relation.keysAreOfEach, found.relation.probesAreOfEach);
+  std::swap(found.key, found.probe);
+  std::swap(found.keyFacts, found.probeFacts);
+  found.relation.relation = XQueryMirrored(found.relation.relation);
+  return true;
 }
 
 // "starts-with(K, P)": each is one text, or the condition is asked as it was written.
@@ -269,6 +322,7 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonAt(const XQueryConditio
   if (const auto* call = dyn_cast<XQueryFunctionCall>(at(place).expr)) {
     if (call->functionDecl()) return comparisonOfCall(place);
     if (call->function() == fn_starts_with) return comparisonOfPrefix(place);
+    if (call->function() == fn_deep_equal) return comparisonOfSame(place);
     const bool asksForTruth = call->function() == fn_exists || call->function() == fn_boolean;
     if (!asksForTruth || !call->args() || call->args()->count() != 1) return {};
     const XQueryPlaceID arguments = _planning.program.part(place, XQueryRole::Arguments);
@@ -276,7 +330,8 @@ XQueryJoinSearch::Comparison XQueryJoinSearch::comparisonAt(const XQueryConditio
         _planning.program.withoutParentheses(_planning.program.firstPart(arguments));
     return isa<XQueryPathExpr>(at(only).expr) ? comparisonOfPath(only) : Comparison();
   }
-  return operandsAt(place, _scope);
+  Comparison found = operandsAt(place, _scope);
+  return found.key ? found : comparisonOfDifference(place);
 }
 
 }  // namespace xquery

@@ -15,6 +15,9 @@
 
 namespace xquery {
 
+class XQueryStep;
+class XQueryWalkedPath;
+
 // What an expression reads while items are picked.
 enum class XQueryJoinReads : uint8_t {
   Item,     // the item and nothing else
@@ -28,6 +31,7 @@ struct XQueryJoinScope {
   XQueryVariableSet item;     // variables that hold the item, or what follows from it alone
   XQueryVariableSet settled;  // variables that are set anew for each item, these included
   int64_t itemID = 0;         // the variable that holds the item itself, if any
+  int level = 0;              // how many conditions it is inside of, which are asked of each node
 
   XQueryJoinReads readsOf(const XQueryFacts& facts) const;
 };
@@ -135,6 +139,15 @@ class XQueryJoinSearch {
   Comparison comparisonOfCall(XQueryPlaceID place) const;
   Comparison comparisonOfPrefix(XQueryPlaceID place) const;
   Comparison comparisonOfPath(XQueryPlaceID place) const;
+  Comparison comparisonOfStart(XQueryPlaceID place, XQueryWalkedPath& path) const;
+  Comparison comparisonOfStep(XQueryPlaceID place, XQueryWalkedPath& path) const;
+  Comparison comparisonOfNodes(XQueryWalkedPath& path, const XQueryStep& step,
+                               const std::vector<XQueryPlaceID>& predicates,
+                               const XQueryFacts& before, bool isOne) const;
+  Comparison comparisonOfDifference(XQueryPlaceID place) const;
+  Comparison comparisonOfSame(XQueryPlaceID place) const;
+  Comparison equalityOf(XQueryPlaceID left, XQueryPlaceID right, XQueryItemKinds kinds) const;
+  bool joinsWith(Comparison& found, bool mayExchange) const;
   bool describePartOfCall(XQueryPlaceID call, XQueryPlaceID body, XQueryPlaceID part,
                           Operand& operand) const;
   Comparison comparisonOfSome(XQueryPlaceID place) const;

@@ -462,6 +462,7 @@ bool XQueryWalkedPath::listNodes(const Value& start, const XQueryWalkedStep& ste
 
 bool XQueryWalkedPath::listNodesBefore(const XQueryStep& step, XQueryContext& context,
                                        std::vector<Value>& nodes) const {
+  if (_start == &step) return listStart(context, nodes);
   Value start = _internal(context).contextItem();
   if (_start) {
     start = evaluateStart(context);
@@ -472,6 +473,18 @@ bool XQueryWalkedPath::listNodesBefore(const XQueryStep& step, XQueryContext& co
   XQueryPathResults results;
   XQueryPathWalk walk(_steps, _trailCount, results, context);
   return isNull(start) || listNodes(start, *last, walk, nodes);
+}
+
+bool XQueryWalkedPath::listStart(XQueryContext& context, std::vector<Value>& nodes) const {
+  const Value items = _start->expr() ? _start->expr()->evaluateWithContext(context) : Value();
+  if (XQueryHasFailed(items, context) || !items || !XQueryAllAreNodes(items)) return false;
+  const XQueryItemList list(items.get());
+  WorkPacer pacer;
+  for (size_t i = 0; i < list.count(); ++i) {
+    pacer.turn();
+    nodes.emplace_back(list[i]);
+  }
+  return true;
 }
 
 // Whether the index of the tree answers at once what tables of the nodes, which every evaluation

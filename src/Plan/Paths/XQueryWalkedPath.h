@@ -71,8 +71,8 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
     _picker = std::move(picker);
     _pickedStep = ofStep;
   }
-  // Lists the nodes that the predicates of such an axis step are asked for; false when that fails,
-  // and for items that are no nodes.
+  // Lists the nodes that the predicates of the start, or of such an axis step, are asked for; false
+  // when that fails, and for items that are no nodes.
   bool listNodesBefore(const XQueryStep& step, XQueryContext& context,
                        std::vector<Value>& nodes) const;
 
@@ -108,6 +108,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   Answer walk(XQueryContext& context, Value& items, XQueryPathResults& results) const;
   Value evaluateStart(XQueryContext& context, std::optional<uint64_t>* number = nullptr) const;
   bool mayEndEarly(const Value& items, const XQueryPathWalk& walk) const;
+  bool listStart(XQueryContext& context, std::vector<Value>& nodes) const;
   bool listNodes(const Value& start, const XQueryWalkedStep& step, XQueryPathWalk& walk,
                  std::vector<Value>& listed) const;
   bool pickItems(Value& items, XQueryContext& context, std::optional<uint64_t>* number) const;

@@ -1,12 +1,13 @@
 // The condition of a FLWOR picks the items of its for clauses.
 //
 // Pattern     for $x in X ... where ... K = P ...; for $x in X ... return if (... K = P ...) then T
-//             else (); sum(for $x in X ... return if (... K = P ...) then T else 0); also <, <=, >,
-//             >=, the value comparisons, "is", on either side, not(K != P), and starts-with(K, P),
-//             among conditions that "and" joins, one of which may be several joined by "or",
-//             however these are written (XQueryConditionParts); K follows from $x, directly,
-//             through let and for clauses behind it, or as "some $y in K satisfies $y = P"; P does
-//             not read $x, nor what later clauses set
+//             else (); for $x in X ... return $x[... K = P ...]/a; sum(for $x in X ... return if
+//             (... K = P ...) then T else 0); also <, <=, >, >=, the value comparisons, "is", on
+//             either side, not(K != P), and starts-with(K, P), among conditions that "and" joins,
+//             one of which may be several joined by "or", however these are written
+//             (XQueryConditionParts); K follows from $x, directly, through let and for clauses
+//             behind it, or as "some $y in K satisfies $y = P"; P does not read $x, nor what later
+//             clauses set
 // Facts       K, P, the conditions before the comparison and the clauses behind $x are repeatable;
 //             a condition before it reads $x alone, or nothing that is set for $x, or cannot fail;
 //             so do the clauses behind $x; what these leave in variables cannot be told; in a sum
@@ -27,6 +28,7 @@
 #include "Plan/Rules.h"
 #include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/PositionConditions.h"
+#include "Plan/Rules/TupleConditions.h"
 
 #include <algorithm>
 #include <string_view>
@@ -86,12 +88,6 @@ std::string_view obstacleToSum(const XQueryFLWORExpr& expr, const XQueryFacts& s
   return {};
 }
 
-// Whether the expression answers no item, and does nothing.
-bool isNothingAt(const XQueryPlanning& planning, XQueryPlaceID place) {
-  const XQueryFacts& facts = planning.facts[place];
-  return facts.most == 0 && facts.deeds == 0 && facts.assigns.isEmpty();
-}
-
 // "return if (C) then T else ()", and "else 0" in a sum; or "if (C) then () else T".
 void joinConditional(XQueryPlanning& planning, XQueryPlaceID place, XQueryFLWORExpr& expr) {
   const XQueryProgram& program = planning.program;
@@ -104,9 +100,9 @@ void joinConditional(XQueryPlanning& planning, XQueryPlaceID place, XQueryFLWORE
   XQueryPlaceID then = program.nextPart(test);
   XQueryPlaceID other = then == XQueryNoPlace ? XQueryNoPlace : program.nextPart(then);
   if (other == XQueryNoPlace) return;
-  const bool isReversed = isNothingAt(planning, then) && !isNothingAt(planning, other);
+  const bool isReversed = XQueryIsNothing(planning, then) && !XQueryIsNothing(planning, other);
   if (isReversed) std::swap(then, other);
-  const bool isNothing = isNothingAt(planning, other);
+  const bool isNothing = XQueryIsNothing(planning, other);
   const bool isZero = !isNothing && XQuerySmallIntegerIn(program[other].expr) == 0 &&
                       sumOf(program, place) == Sum::Plain;
   XQueryClauseJoins joins(planning, place, part, test,
@@ -129,6 +125,19 @@ void joinConditional(XQueryPlanning& planning, XQueryPlaceID place, XQueryFLWORE
   describeYield(planning, place, then, expr);
 }
 
+// "return $x[C]/a" and "return $x/b[C]", which answer nothing where nothing is left.
+void joinFilter(XQueryPlanning& planning, XQueryPlaceID place, XQueryFLWORExpr& expr) {
+  const XQueryPlaceID path = XQueryFilterOfTuples(planning, place);
+  if (path == XQueryNoPlace) return;
+  const XQueryPlaceID part = planning.program.part(place, XQueryRole::Return);
+  XQueryClauseJoins joins(planning, place, part, path, Picks::WhereItHolds);
+  if (expr.orderSpecs().empty()) {
+    joins.join();
+  } else if (joins.seesComparison()) {
+    planning.refuse(place, "what is ordered by may fail for an item that would be left out");
+  }
+}
+
 }  // namespace
 
 void XQueryJoinForClauses(XQueryPlanning& planning) {
@@ -144,6 +153,7 @@ void XQueryJoinForClauses(XQueryPlanning& planning) {
       if (joins && answer != XQueryNoPlace) describeYield(planning, place, answer, *expr);
     } else {
       joinConditional(planning, place, *expr);
+      joinFilter(planning, place, *expr);
     }
   }
 }

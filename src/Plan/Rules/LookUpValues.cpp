@@ -3,7 +3,7 @@
 // Pattern     a step child::name, child::*, descendant::name or //@name, also behind "//", with a
 //             predicate that holds only for what has one of some values (ValueConditions.h); such a
 //             step as the last one of P in "(P)[C]", where C is such a condition, and in "for $x in
-//             P ... where C"
+//             P ... where C", "for $x in P return $x[C]" and the like (TupleConditions.h)
 // Facts       of the step: all predicates ask for truth, whatever place a node has, and can be
 //             repeated with all steps behind; of the value that is asked for: it is repeatable and
 //             does not read the focus, but for the root in a predicate, or where the path begins
@@ -18,6 +18,7 @@
 #include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryNameTest.h"
+#include "Expr/XQueryBinding.h"
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Joins/XQueryJoinedSteps.h"
 #include "Plan/Planning.h"
@@ -25,6 +26,7 @@
 #include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/StepsAround.h"
+#include "Plan/Rules/TupleConditions.h"
 #include "Plan/Rules/ValueConditions.h"
 
 #include <algorithm>
@@ -81,27 +83,28 @@ class Search {
     if (takeCondition(predicates.front(), {}, *path, last)) _planning.choose(place);
   }
 
-  // A "for" before the where clause, the last one or one behind which nobody can tell that clauses
-  // are not evaluated.
+  // A "for" before the condition, the last one or one behind which nobody can tell that clauses are
+  // not evaluated.
   void takeClause(XQueryPlaceID place) {
-    const XQueryPlaceID where = _program.part(place, XQueryRole::Where);
-    if (where == XQueryNoPlace || !isIdleButForErrors(firstConditionOf(where))) return;
+    const XQueryPlaceID condition = XQueryConditionOfTuples(_planning, place);
+    if (condition == XQueryNoPlace || !isIdleButForErrors(firstConditionOf(condition))) return;
     std::vector<XQueryPlaceID> clauses;
-    for (XQueryPlaceID part = _program.firstPart(place); part != where;
-         part = _program.nextPart(part)) {
+    for (XQueryPlaceID part = _program.firstPart(place);
+         isa<XQueryBindingExpr>(_program[part].expr); part = _program.nextPart(part)) {
       clauses.push_back(part);
     }
     XQueryValueOrigin origin;
     while (!clauses.empty()) {
       const XQueryPlaceID clause = clauses.back();
       clauses.pop_back();
-      if (isa<XQueryForExpr>(_program[clause].expr) && takeClause(clause, where, origin)) return;
-      if (!addLater(clause, origin)) return;
+      const bool isTaken =
+          isa<XQueryForExpr>(_program[clause].expr) && takeClause(clause, condition, origin);
+      if (isTaken || !addLater(clause, origin)) return;
     }
   }
 
   // `origin` has the variables that are set behind the clause.
-  bool takeClause(XQueryPlaceID place, XQueryPlaceID where, XQueryValueOrigin origin) {
+  bool takeClause(XQueryPlaceID place, XQueryPlaceID condition, XQueryValueOrigin origin) {
     const auto& clause = *cast<XQueryForExpr>(_program[place].expr);
     if (clause.type() || clause.posVarID() != 0 || clause.varID() == 0) return false;
     XQueryWalkedPath* path = wholePathAt(_program.part(place, XQueryRole::Bound));
@@ -109,16 +112,16 @@ class Search {
     origin.varID = clause.varID();
     origin.errorExcludes = false;
     origin.isInTreeOfFocus = path->start() && isa<XQueryRootStep>(path->start());
-    XQueryVariableSet leftovers = _planning.facts[where].assigns;
+    XQueryVariableSet leftovers = _planning.facts[condition].assigns;
     leftovers.add(origin.own);
     leftovers.add(clause.varID());
     XQueryWalkedStep& step = path->changeableSteps().back();
-    if (!conditionFor(where, origin, targetOf(*path, step))) return false;
+    if (!conditionFor(condition, origin, targetOf(*path, step))) return false;
     if (_planning.showsLeftovers(leftovers, place)) {
       _planning.refuse(place, "a variable that would be left with another item may be read");
       return false;
     }
-    if (!takeCondition(where, origin, *path, step)) return false;
+    if (!takeCondition(condition, origin, *path, step)) return false;
     _planning.choose(place);
     return true;
   }

@@ -381,15 +381,21 @@ class Search {
   // Errors in these drop a node.
   Found ofPath(XQueryPlaceID place, const Start& from, int level) const {
     const auto& path = *cast<XQueryPathExpr>(_program[place].expr);
+    if (!facts(place).are(XQueryItems::Node)) return std::nullopt;
+    const XQueryStep* const start = path.step();
+    const bool filtersOrigin = start && start->kind() == Kind::FilterStep &&
+                               isOrigin(XQueryWithoutParentheses(start->expr()), from);
     const XQueryStep* const first = firstAxisStep(path, from);
-    if (!first || !facts(place).are(XQueryItems::Node)) return std::nullopt;
+    if (!first && !filtersOrigin) return std::nullopt;
     for (XQueryPlaceID part = _program.firstPart(place); part != XQueryNoPlace;
          part = _program.nextPart(part)) {
       const XQueryPlace& at = _program[part];
       if (at.role != XQueryRole::Predicate || !at.step) continue;
+      const bool isOfOrigin = filtersOrigin && at.step == start;
+      if (!first && !isOfOrigin) break;
       Start inner = from;
       inner.origin = {};
-      if (!inner.way.addSteps(first, at.step->next())) return std::nullopt;
+      if (!isOfOrigin && !inner.way.addSteps(first, at.step->next())) return std::nullopt;
       if (Found found = conditionIn(part, inner, level + 1)) return found;
     }
     return std::nullopt;
