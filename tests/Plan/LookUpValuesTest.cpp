@@ -77,7 +77,7 @@ TEST(LookUpValues, TakesProbesFromTheRootInPredicates) {
   }
   // In another focus there may be another root, or none.
   for (const char* text :
-       {"for $i in /r for $e in $i/e where $e/@id = /r/e[8]/@id return $e/k",
+       {"for $i in //r for $e in $i/e where $e/@id = /r/e[8]/@id return $e/k",
         "for $e in r/e where $e/@id = /r/e[8]/@id return $e/k",
         "declare function local:f($e) { $e/@id = /r/e[8]/@id }; /r/e[local:f(.)]"}) {
     EXPECT_EQ(lookupsIn(text), 0U) << text;
@@ -344,7 +344,7 @@ TEST(LookUpValues, TakesAnEarlierClauseBehindWhichNothingCanBeTold) {
            "for $e in /r/e, $k in doc(string($e/k[1])) where $e/@id = 'e7' return $k",
            "for $e in /r/e, $k in $e/k where $k and $e/@id = 'e7' return $k",
            "for $e in /r/e, $k in $e/k where $e/@id = $k return $k",
-           "for $e in /r/e, $k in $e/k let $i := string($k/@id) where $i = 'e7' return $k",
+           "for $e in //e, $k in $e/k let $i := string($k/@id) where $i = 'e7' return $k",
            "for $e at $n in /r/e, $k in $e/k where $e/@id = 'e7' return $n",
        }) {
     EXPECT_EQ(lookupsIn(text), 0U) << text;

@@ -26,7 +26,11 @@ std::string ProgramGenerator::program() {
   _hasGlobal = !text.empty();
   if (_random.below(2) == 0) text += function("local:f", "");
   if (_random.below(3) == 0) text += function("local:r", "local:r");
-  return text + expr(5);
+  if (_random.below(4)) return text + expr(5);
+  const std::string path = pathDown();
+  text += "declare variable $h := " + path + ";\ndeclare function local:h() { " + path + " };\n";
+  return text + "(" + inParts("$h") + ", " + inParts("local:h()") + ", (let $h := " + path +
+         " return " + inParts("$h") + "), " + loopsInParts() + ", " + expr(2) + ")";
 }
 
 std::string ProgramGenerator::element(int depth) {

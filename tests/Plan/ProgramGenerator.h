@@ -82,6 +82,9 @@ class ProgramGenerator {
 
   // Lists long enough for a table, mostly.
   std::string many();
+  std::string pathDown();
+  std::string inParts(const std::string& whole);
+  std::string loopsInParts();
   std::string keyOf(const std::string& item);
   std::string match(const std::string& item);
   std::string difference(const std::string& one, const std::string& other);

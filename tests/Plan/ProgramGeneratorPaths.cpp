@@ -248,4 +248,43 @@ std::string ProgramGenerator::operand(int depth) {
   }
 }
 
+// Mostly one that goes down from the document by names alone.
+std::string ProgramGenerator::pathDown() {
+  return _random.oneOf({"/a", "//a", "/a/b", "//b", "/a/*", "//@x", "/a//b", "(/a/b/c)", "//a//b",
+                        "/a/b/@x", "//b[@x]", "*", "(//a | //b)", "//text()"});
+}
+
+// What is asked of a variable or a function that stands for such a path.
+std::string ProgramGenerator::inParts(const std::string& whole) {
+  const auto use = [&] {
+    const std::string filtered = whole + "[" + match(".") + "]";
+    const std::string loop = " $u in " + whole + " ";
+    switch (_random.below(8)) {
+      case 0:
+        return filtered + _random.oneOf({"", "/@x", "/*", "/..", "[@y]", "[1]", "/string(@x)"});
+      case 1:
+        return _random.oneOf({"count(", "exists(", "empty(", "not("}) + whole + ")";
+      case 2:
+        return "(for" + loop +
+               within("$u", [&] { return "where " + matches("$u") + " return $u)"; });
+      case 3:
+        return "(some" + loop + within("$u", [&] { return "satisfies " + match("$u") + ")"; });
+      case 4:
+        return "(for $o in 1 to 3 return " + whole + "[@x = string($o)])";
+      case 5:
+        return "(//a)[position() < 4][" + whole + "/@x = @x]";
+      default:
+        return whole + _random.oneOf({"/b", "/*/@x", "//b", "/..", "[@x][@y]/*", "[b]", "/b[1]"});
+    }
+  };
+  const std::string last = _random.below(6) ? use() : whole + _random.oneOf({"", "[2]"});
+  return "(" + use() + ", " + use() + ", " + last + ")";
+}
+
+std::string ProgramGenerator::loopsInParts() {
+  const std::string further = _random.oneOf({"/b", "/*", "/b/c", "/@x", "/b[1]", "/*[@x]", "//b"});
+  return "(for $u in " + pathDown() + ", $v in $u" + further + " where " + matches("$v") +
+         " return " + _random.oneOf({"$v", "$v", "($v, 1)", "$v/..", "$u"}) + ")";
+}
+
 }  // namespace xquery::plantest

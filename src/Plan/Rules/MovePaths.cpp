@@ -18,6 +18,7 @@
 #include "Plan/Operators/XQueryMovedPath.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/EvaluatedOnce.h"
 #include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/SplicePath.h"
@@ -165,39 +166,7 @@ class Search {
            !facts.mayBe(XQueryItems::Numeric | XQueryItems::Other);
   }
 
-  // In one evaluation of its body.
-  bool isEvaluatedOnce(XQueryPlaceID place) const {
-    for (int level = 0; level < XQueryPlanning::mostLevels; ++level) {
-      const XQueryPlace& here = _program[place];
-      if (here.parent == XQueryNoPlace) return true;
-      switch (here.role) {
-        case XQueryRole::Step:
-        case XQueryRole::Predicate:
-        case XQueryRole::Satisfies:
-          return false;
-        case XQueryRole::Clause:
-        case XQueryRole::Where:
-        case XQueryRole::Return:
-          if (standsBehindFor(place)) return false;
-          break;
-        default:
-          break;
-      }
-      place = here.parent;
-    }
-    return false;
-  }
-
-  // Of a part of a FLWOR or a quantifier.
-  bool standsBehindFor(XQueryPlaceID part) const {
-    const XQueryPlaceID whole = _program[part].parent;
-    for (XQueryPlaceID each = _program.firstPart(whole); each != part;
-         each = _program.nextPart(each)) {
-      const Kind kind = _program[each].expr->kind();
-      if (kind == Kind::ForExpr || kind == Kind::QuantifiedItem) return true;
-    }
-    return false;
-  }
+  bool isEvaluatedOnce(XQueryPlaceID place) const { return XQueryIsEvaluatedOnce(_program, place); }
 
   XQueryPlanning& _planning;
   const XQueryProgram& _program;
