@@ -14,7 +14,10 @@
 
 #include <algorithm>
 #include <functional>
+#include <iterator>
+#include <map>
 #include <unordered_map>
+#include <unordered_set>
 #include <utility>
 
 namespace xquery {
@@ -92,7 +95,7 @@ Ref<XQueryPathExpr> pathOf(Ref<XQueryStep> start, const XQueryStep* down, Rest r
 class Joining {
  public:
   Joining(XQueryProgram& program, const XQueryFactTable& facts)
-      : _program(program), _facts(facts), _isTaken(program.placeCount()) {}
+      : _program(program), _facts(facts) {}
 
   std::vector<const XQueryExpr*> run() {
     if (_program.bodies().empty()) return {};
@@ -144,7 +147,8 @@ class Joining {
     for (XQueryPlaceID place = 0; place < _program.placeCount(); ++place) {
       if (const auto* variable = dyn_cast<XQueryVariable>(at(place).expr)) {
         if (at(place).binder != XQueryNoPlace) _uses[at(place).binder].push_back(place);
-        if (variable->varID() == 0) _ofGlobals.push_back(place);
+        if (variable->varID() == 0) noteGlobal(place, *variable);
+        if (place >= mainPlace() && !_facts.isSurelySet(place)) _unset.insert(variable->varID());
       } else if (const auto* call = dyn_cast<XQueryFunctionCall>(at(place).expr)) {
         if (call->functionDecl()) _calls[call->functionDecl()].push_back(place);
         const auto* builtIn = call->builtIn();
@@ -153,6 +157,11 @@ class Joining {
         _mayDeclare = _mayDeclare || !isKnown;
       }
     }
+  }
+
+  void noteGlobal(XQueryPlaceID place, const XQueryVariable& variable) {
+    const auto name = _program.bodies().back().prolog->variableQNameFromString(variable.name());
+    if (name) _ofGlobals[name].push_back(place);
   }
 
   // --- what a path may be put in the place of
@@ -164,14 +173,11 @@ class Joining {
   };
 
   bool mayTake(XQueryPlaceID whole) const {
-    const auto first = _isTaken.begin() + static_cast<std::ptrdiff_t>(whole);
-    const auto end = _isTaken.begin() + static_cast<std::ptrdiff_t>(at(whole).end);
-    return at(whole).slot && at(whole).isOrdered && std::find(first, end, true) == end;
+    const auto behind = _taken.lower_bound(at(whole).end);
+    const bool isFree = behind == _taken.begin() || std::prev(behind)->second <= whole;
+    return isFree && at(whole).slot && at(whole).isOrdered;
   }
-  void take(XQueryPlaceID whole) {
-    std::fill(_isTaken.begin() + static_cast<std::ptrdiff_t>(whole),
-              _isTaken.begin() + static_cast<std::ptrdiff_t>(at(whole).end), true);
-  }
+  void take(XQueryPlaceID whole) { _taken[whole] = at(whole).end; }
 
   // Asked once, and for what an index may answer: of a list that is kept there are tables, and it
   // is gone over sooner than the path is walked again.
@@ -289,34 +295,19 @@ class Joining {
   }
 
   // Whether the local variable may be read in the body of the query where nothing has set it.
-  bool mayBeLeft(int64_t varID) const {
-    for (XQueryPlaceID place = mainPlace(); place < _program.placeCount(); ++place) {
-      const auto* variable = dyn_cast<XQueryVariable>(at(place).expr);
-      if (variable && variable->varID() == varID && !_facts.isSurelySet(place)) return true;
-    }
-    return varID <= 0;
-  }
+  bool mayBeLeft(int64_t varID) const { return varID <= 0 || _unset.contains(varID); }
 
   // An evaluation inside of this one may give the variable another value.
   void joinGlobal(const XQueryProgramBody& body) {
     if (_mayDeclare || !stepsDownAt(body.place) || !mayTake(body.place)) return;
-    const XQueryQName& name = *body.variable->name();
-    for (const XQueryProgramBody& other : _program.bodies()) {
-      const bool isSame =
-          other.variable && &other != &body && other.variable->name()->isEqual(name);
-      if (isSame) return;
-    }
-    Places places;
-    for (const XQueryPlaceID place : _ofGlobals) {
-      const auto read =
-          body.prolog->variableQNameFromString(cast<XQueryVariable>(at(place).expr)->name());
-      if (!read || !read->isEqual(name)) continue;
+    const auto uses = _ofGlobals.find(body.variable->name());
+    if (uses == _ofGlobals.end()) return;
+    for (const XQueryPlaceID place : uses->second) {
       // It is not there yet.
       if (place < body.place && _program.bodyOf(place).variable) return;
-      places.push_back(place);
     }
     std::vector<Use> found;
-    if (findAll(places, found)) putAll(body.place, found);
+    if (findAll(uses->second, found)) putAll(body.place, found);
   }
 
   // A call answers the document above its own focus, which is that of its place.
@@ -394,12 +385,13 @@ class Joining {
 
   XQueryProgram& _program;
   const XQueryFactTable& _facts;
-  std::vector<bool> _isTaken;  // for each place: it, or what is around it, has been written anew
+  std::map<XQueryPlaceID, XQueryPlaceID> _taken;  // what has been written anew: where it ends
   std::vector<const XQueryExpr*> _joined;
   Places _lets;    // of the query's body, in its focus, that are set to such a path
   Places _flwors;  // the same of those that begin with a loop over one
   std::unordered_map<XQueryPlaceID, Places> _uses;  // of variables, by clause
-  Places _ofGlobals;
+  std::unordered_map<Ref<XQueryQName>, Places, XQueryQNameHash, XQueryQNameEqual> _ofGlobals;
+  std::unordered_set<int64_t> _unset;  // variables that the body of the query may read unset
   std::unordered_map<const XQueryFunctionDecl*, Places> _calls;
   bool _mayDeclare = false;
 };

@@ -8,6 +8,7 @@
 #include <cstdlib>
 #include <optional>
 #include <string_view>
+#include <unordered_set>
 #include <vector>
 
 namespace xquery {
@@ -41,7 +42,7 @@ class WholeProgram {
     for (int round = 0; round < mostRounds; ++round) {
       const auto joined = XQueryJoinPaths(*_program, _planning->facts);
       if (joined.empty()) break;
-      _joined.insert(_joined.end(), joined.begin(), joined.end());
+      _joined.insert(joined.begin(), joined.end());
       read(prolog, _program->install());
     }
     if (!_joined.empty() && !isPossible) projection.refusedAt = placeOf(refused);
@@ -58,7 +59,7 @@ class WholeProgram {
     });
     for (XQueryPlaceID place = 0; place < _program->placeCount() && !_joined.empty(); ++place) {
       const XQueryExpr* expr = (*_program)[place].expr;
-      if (std::find(_joined.begin(), _joined.end(), expr) == _joined.end()) continue;
+      if (!_joined.contains(expr)) continue;
       notes.push_back({place, &*rule, false, "it is put together from paths that were apart"});
     }
   }
@@ -79,7 +80,7 @@ class WholeProgram {
 
   std::optional<XQueryProgram> _program;
   std::optional<XQueryPlanning> _planning;
-  std::vector<const XQueryExpr*> _joined;
+  std::unordered_set<const XQueryExpr*> _joined;
 };
 
 }  // namespace
