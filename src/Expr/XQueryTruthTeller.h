@@ -10,7 +10,7 @@ class XQueryContext;
 class XQueryTruthTeller {
  public:
   // The effective boolean value; nothing where it takes evaluating the expression to tell. Throws
-  // nothing.
+  // where a limit of the evaluation is reached.
   virtual std::optional<bool> truth(const XQueryContext& context) const = 0;
 
  protected:

@@ -78,14 +78,15 @@ constexpr std::array rules = {
     // Behind the joins, which evaluate what conditions consist of.
     XQueryRule{"early conditions", "a condition is asked as soon as what it reads is there",
                XQueryAskEarly},
+    // Before what calls these functions with machine numbers.
+    XQueryRule{"functions",
+               "functions of numbers are computed with machine numbers, calls included",
+               XQueryComputeFunctions},
     XQueryRule{"scalars", "arithmetic, comparisons and logic over numbers make no objects between",
                XQueryComputeScalars},
     // Behind what it adds without making it.
     XQueryRule{"folds", "what a loop yields is summed up or compared as it comes, without a list",
                XQueryFoldNumbers},
-    XQueryRule{"functions",
-               "functions of numbers are computed with machine numbers, calls included",
-               XQueryComputeFunctions},
     // Behind all that evaluates expressions otherwise than they are written.
     XQueryRule{"last uses", "a list that is read for the last time is changed instead of copied",
                XQueryTakeLastUses},

@@ -62,11 +62,53 @@ TEST(ScalarFunctions, AreComputedWhateverTheirForm) {
       {"$n", "if (if ($n > 0) then $n > 5 else $n < -5) then 1 else 0",
        "for $i in -7 to 7 return local:f($i)"},
       {"", "1 + 2 * 3", "local:f()"},
+      {"$n", "$n > 1 and (every $d in 2 to $n - 1 satisfies $n mod $d != 0)",
+       "for $i in 0 to 20 return local:f($i)"},
+      {"$n", "some $a in 1 to $n satisfies (some $b in $a to $n satisfies $a * $a + $b * $b = $n)",
+       "for $i in 0 to 20 return local:f($i)"},
+      {"$n", "every $d in (1 to $n) satisfies $d", "local:f(3), local:f(-1)"},
   };
   for (const auto& example : cases) {
     const std::string text = function(example.parameters, example.body, example.call);
     EXPECT_EQ(computedIn(text), 1U) << text;
     sameBothWays(text);
+  }
+}
+
+// Ten parameters and variables are the most.
+TEST(ScalarFunctions, HaveFewVariables) {
+  std::string body = "$n";
+  for (int depth = 0; depth < 20; ++depth) {
+    body = "(let $v" + std::to_string(depth) + " := " + body + " return $v" +
+           std::to_string(depth) + " + 1)";
+    const std::string text = function("$n", body, "local:f(1)");
+    EXPECT_EQ(computedIn(text), depth < 9 ? 1U : 0U) << text;
+    sameBothWays(text);
+    sameBothWays(function("$n", "every $i in 1 to " + body + " satisfies $i > $n", "local:f(1)"));
+  }
+}
+
+TEST(ScalarFunctions, AreCalledWithMachineNumbers) {
+  for (const char* call :
+       {"sum(for $i in 1 to 20 return local:f($i))",
+        "for $i in 1 to 20 where local:f($i) > 3 "
+        "return $i",
+        "for $i in 1 to 9 return if (local:f($i)) then $i else 0",
+        "for $i in (1, 2.5, 'x', 3)[. instance of xs:integer] return local:f($i) * 2 + $i",
+        "for $i in (1, 2.5, 3e0, xs:byte(4), ()) return (local:f($i), local:f($i) + 1)",
+        "sum(for $i in 1 to 4 return local:f(local:f($i)))",
+        "max(for $i in //n return "
+        "local:f($i))",
+        "(1 to 4)/local:f(.)", "for $i in 1 to 4 return local:f((1, $i))",
+        "(1 to 9)[local:f(.) > 4]", "some $i in 1 to 9 satisfies local:f($i) = 7",
+        "for $i in 1 to 3 return local:f($u) + 1",
+        "for $i in 1 to 3 return local:f(1 idiv ($i - "
+        "2)) + 1"}) {
+    for (const char* body :
+         {"if ($n < 3) then 1 else $n", "if ($n < 1) then 0 else $n + local:f($n - 1)",
+          "$n mod 3 = 0", "$n", "not($n > 4)", "if ($n = 2) then 1 idiv 0 else $n * 1.5e0"}) {
+      agree(function("$n", body, call), numbers());
+    }
   }
 }
 
@@ -214,7 +256,9 @@ class ProgramOfNumbers {
              " else\n " + term(4) + " };\n";
     }
     return all + "for $v in (" + _random.oneOf({"1, 2", "3", "2, 'a', 3"}) + ") return (" +
-           "local:f($v, " + constant() + "), local:g(2, $v), local:f(2, local:g(1, 2)))";
+           "local:f($v, " + constant() +
+           "), local:g(2, $v), local:f(2, local:g(1, 2)), "
+           "local:g($v, 1) + local:f(1, $v), sum(for $i in 1 to 3 return local:f($i, 2)))";
   }
 
  private:
@@ -245,7 +289,7 @@ class ProgramOfNumbers {
     if (depth <= 0) {
       return _random.below(4) == 0 ? constant() : _random.oneOf({"$n", "$x", "$n", "true()"});
     }
-    switch (_random.below(9)) {
+    switch (_random.below(10)) {
       case 0:
         return "(if (" + condition(depth) + ") then " + term(depth - 1) + " else " +
                term(depth - 1) + ")";
@@ -261,6 +305,11 @@ class ProgramOfNumbers {
                ", " + term(depth / 2) + ")";
       case 5:
         return "-" + term(0);
+      case 6:
+        return "(" + _random.oneOf({"some", "every"}) + " $i in " +
+               _random.oneOf({"1", "$n", "-1"}) + " to " + _random.oneOf({"3", "$n", "$x"}) +
+               " satisfies " + condition(1) + _random.oneOf({"", " and $i > 1", " or $i = $n"}) +
+               ")";
       default:
         return "(" + term(depth - 1) +
                _random.oneOf({" + ", " - ", " * ", " idiv ", " mod ", " div "}) + term(depth - 1) +

@@ -14,6 +14,7 @@ namespace xquery {
 
 class XQueryItemYielder;
 class XQueryNodeQuestion;
+class XQueryScalarBody;
 class XQueryWalkedPath;
 
 class XQueryPlannedExpr : public XQueryExpr {
@@ -27,6 +28,8 @@ class XQueryPlannedExpr : public XQueryExpr {
   virtual const XQueryNodeQuestion* nodeQuestion() const { return nullptr; }
   // Itself, where it can be added to a fold without being made; null for most.
   virtual const XQueryItemYielder* itemYielder() const { return nullptr; }
+  // Itself, where it is the body of a function that machine numbers can be passed to.
+  virtual const XQueryScalarBody* scalarBody() const { return nullptr; }
   // What it stands for has been bound.
   void bindInfoForProlog(XQueryProlog&) override {}
   void visitParts(XQueryPartVisitor& visitor) override {

@@ -3,19 +3,17 @@
 #include "Context/XQueryContextInternal.h"
 #include "Types/XQueryNumber.h"
 
+#include <algorithm>
 #include <array>
 
 namespace xquery {
-namespace {
 
-// Of an argument; an object unless there is no more to it than whether it is true.
-XQueryScalar scalarOf(const NSObject* argument) {
+// An object unless there is no more to it than whether it is true.
+XQueryScalar XQueryScalarBody::scalarOf(const NSObject* argument) {
   if (argument == NSNumber::trueValue()) return XQueryScalar::ofTruth(true);
   if (argument == NSNumber::falseValue()) return XQueryScalar::ofTruth(false);
   return isa<XQueryNumber>(argument) ? XQueryScalar::ofObject(argument) : XQueryScalar();
 }
-
-}  // namespace
 
 // Null where it is not known. Which object an answer is can be told: an argument, which the frame
 // holds, or a literal is answered itself.
@@ -40,22 +38,28 @@ Value XQueryScalarBody::valueOf(const XQueryScalar& answer, XQueryContext& conte
 
 Value XQueryScalarBody::computeValue(XQueryContext& context) const {
   auto& dynamic = _internal(context);
-  const bool isOpen = _failures.load(std::memory_order_relaxed) < mostFailures;
   // A profile counts what is evaluated.
-  if (!isOpen || dynamic.profile()) return plain().evaluateWithContext(context);
+  if (dynamic.profile()) return plain().evaluateWithContext(context);
   std::array<XQueryScalar, XQueryScalarProgram::mostSlots> slots;
-  bool areNumbers = true;
   for (size_t index = 0; index < _parameters.size(); ++index) {
     slots[index] = scalarOf(dynamic.variableForID(_parameters[index]));
-    areNumbers = areNumbers && slots[index].form != XQueryScalar::Unknown;
   }
-  bool outOfStack = false;
-  if (areNumbers) {
-    const XQueryScalar answer = _program->scalars.answer(_function, slots.data(), outOfStack);
-    if (Value value = valueOf(answer, context)) return value;
-  }
-  _failures.fetch_add(outOfStack ? mostFailures : 1, std::memory_order_relaxed);
+  if (Value value = valueOf(answer(slots.data()), context)) return value;
   return plain().evaluateWithContext(context);
+}
+
+XQueryScalar XQueryScalarBody::answer(XQueryScalar* arguments) const {
+  if (_failures.load(std::memory_order_relaxed) >= mostFailures) return {};
+  const bool areKnown = std::all_of(
+      arguments, arguments + _parameters.size(),
+      [](const XQueryScalar& argument) { return argument.form != XQueryScalar::Unknown; });
+  bool outOfStack = false;
+  XQueryScalar answer;
+  if (areKnown) answer = _program->scalars.answer(_function, arguments, outOfStack);
+  if (answer.form == XQueryScalar::Unknown) {
+    _failures.fetch_add(outOfStack ? mostFailures : 1, std::memory_order_relaxed);
+  }
+  return answer;
 }
 
 }  // namespace xquery

@@ -31,6 +31,14 @@ class XQueryScalarBody : public XQueryPlannedExpr {
   }
 
   Value computeValue(XQueryContext& context) const override;
+  const XQueryScalarBody* scalarBody() const override { return this; }
+
+  // What the function answers for these arguments, which are overwritten; Unknown where the body
+  // has to be evaluated. Throws where a limit of the evaluation is reached.
+  XQueryScalar answer(XQueryScalar* arguments) const;
+  size_t parameterCount() const { return _parameters.size(); }
+  // Of an argument: Unknown for what is neither a number nor a truth value.
+  static XQueryScalar scalarOf(const NSObject* argument);
 
  protected:
   XQueryScalarBody(Ref<XQueryExpr> plain, std::shared_ptr<const Program> program,

@@ -2,7 +2,11 @@
 
 #include "Context/XQueryContextInternal.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/XQueryAsking.h"
+#include "Plan/Operators/XQueryScalarBody.h"
 #include "Types/XQueryNumber.h"
+
+#include <array>
 
 namespace xquery {
 namespace {
@@ -55,8 +59,25 @@ XQueryScalar XQueryScalarSteps::valueOf(Index index, const XQueryContextInternal
     case Kind::Or:
     case Kind::Not:
       return logic(step, context);
+    case Kind::Call:
+      return called(step, context);
   }
   return {};
+}
+
+// A profile counts what is evaluated.
+XQueryScalar XQueryScalarSteps::called(const Step& step,
+                                       const XQueryContextInternal& context) const {
+  if (context.profile()) return {};
+  std::array<Scalar, XQueryScalarProgram::mostSlots> arguments;
+  for (size_t index = 0; index < step.code; ++index) {
+    arguments[index] = operand(_operands[step.left + index], context);
+    if (arguments[index].form == Form::Object) {
+      arguments[index] = XQueryScalarBody::scalarOf(arguments[index].object);
+    }
+    if (arguments[index].form == Form::Unknown) return {};
+  }
+  return step.body->answer(arguments.data());
 }
 
 // The operand behind one that decides is not looked at.
@@ -86,7 +107,12 @@ Value XQueryScalarExpr::computeValue(XQueryContext& context) const {
 }
 
 bool XQueryScalarExpr::yieldTo(XQueryItemFold& fold, XQueryContext& context) const {
-  const Scalar answer = _steps.answer(context);
+  return XQueryAsk(*this, context,
+                   [&] { return yieldAnswer(_steps.answer(context), fold, context); });
+}
+
+bool XQueryScalarExpr::yieldAnswer(const XQueryScalar& answer, XQueryItemFold& fold,
+                                   XQueryContext& context) const {
   if (answer.form == Form::Integer) {
     fold.addInteger(answer.integer);
     return true;

@@ -42,6 +42,7 @@ class XQueryScalarSteps {
     And,
     Or,
     Not,
+    Call,  // left: the first of its operands; code: their number; the body of the function
   };
   struct Step {
     Kind kind = Kind::Constant;
@@ -50,6 +51,7 @@ class XQueryScalarSteps {
     Index right = 0;  // or the only one
     int64_t varID = 0;
     XQueryScalar constant{};
+    const XQueryScalarBody* body = nullptr;  // of the same program
   };
 
   // The index of the step.
@@ -57,18 +59,26 @@ class XQueryScalarSteps {
     _steps.push_back(step);
     return static_cast<Index>(_steps.size() - 1);
   }
+  // Of a call, which stand in a row. The index of the first.
+  Index addOperands(const std::vector<Index>& operands) {
+    _operands.insert(_operands.end(), operands.begin(), operands.end());
+    return static_cast<Index>(_operands.size() - operands.size());
+  }
   size_t count() const { return _steps.size(); }
   const Step& operator[](size_t index) const { return _steps[index]; }
 
-  // What the last step comes to; Unknown, among others, for an object.
+  // What the last step comes to; Unknown, among others, for an object. Throws where a call reaches
+  // a limit of the evaluation.
   XQueryScalar answer(const XQueryContext& context) const;
 
  private:
   XQueryScalar valueOf(Index index, const XQueryContextInternal& context) const;
   XQueryScalar operand(Index index, const XQueryContextInternal& context) const;
   XQueryScalar logic(const Step& step, const XQueryContextInternal& context) const;
+  XQueryScalar called(const Step& step, const XQueryContextInternal& context) const;
 
   std::vector<Step> _steps;
+  std::vector<Index> _operands;
 };
 
 class XQueryScalarExpr : public XQueryPlannedExpr,
@@ -92,6 +102,8 @@ class XQueryScalarExpr : public XQueryPlannedExpr,
   friend Ref<T> make(Arguments&&...);
 
  private:
+  bool yieldAnswer(const XQueryScalar& answer, XQueryItemFold& fold, XQueryContext& context) const;
+
   const XQueryScalarSteps _steps;
 };
 

@@ -140,8 +140,31 @@ struct XQueryScalarProgram::Run {
       }
       case Kind::Call:
         return nested(term, slots);
+      case Kind::Quantifier:
+        return quantified(term, slots);
     }
     return {};
+  }
+
+  Scalar quantified(const Term& term, Scalar* slots) {
+    // A longer range may be refused.
+    constexpr int64_t mostIntegers = 10'000'000;
+    const Scalar first = value(program._terms[term.left], slots);
+    if (first.form != Form::Integer) return {};
+    const Scalar last = value(program._terms[term.right], slots);
+    if (last.form != Form::Integer) return {};
+    const bool ofEvery = term.constant.truth;
+    if (first.integer > last.integer) return Scalar::ofTruth(ofEvery);
+    int64_t distance = 0;
+    const bool isFar = __builtin_sub_overflow(last.integer, first.integer, &distance);
+    if (isFar || distance > mostIntegers) return {};
+    for (int64_t each = first.integer; each <= last.integer; ++each) {
+      checkWork();
+      slots[term.code] = Scalar::ofInteger(each);
+      const Scalar holds = XQueryScalarTruth(value(program._terms[term.third], slots));
+      if (holds.form == Form::Unknown || holds.truth != ofEvery) return holds;
+    }
+    return Scalar::ofTruth(ofEvery);
   }
 
   // The operand behind one that decides is not looked at.

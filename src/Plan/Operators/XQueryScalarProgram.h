@@ -2,12 +2,12 @@
 //
 //   declare function local:gcd($a, $b) { if ($b = 0) then $a else local:gcd($b, $a mod $b) };
 //
-// A body of literals, parameters, let variables, arithmetic, comparisons, logic, conditionals and
-// calls of functions like it becomes a tree of terms. A call computes with slots on the stack in
-// place of a frame of variables, and neither arguments nor answers are made objects. Wherever an
-// operand is something else than these numbers, an integer leaves its word, there would be an error
-// or the stack ends, nothing is known, and the body is evaluated as it was written: terms do
-// nothing that could be told.
+// A body of literals, parameters, let variables, arithmetic, comparisons, logic, conditionals,
+// quantifiers over ranges and calls of functions like it becomes a tree of terms. A call computes
+// with slots on the stack in place of a frame of variables, and neither arguments nor answers are
+// made objects. Wherever an operand is something else than these numbers, an integer leaves its
+// word, there would be an error or the stack ends, nothing is known, and the body is evaluated as
+// it was written: terms do nothing that could be told.
 #pragma once
 
 #include "Plan/Operators/XQueryScalar.h"
@@ -36,6 +36,9 @@ class XQueryScalarProgram {
     Conditional,  // left: the test; right and third: the branches
     Let,          // code: the slot; left: what it takes; right: what is computed with it
     Call,         // left: the function; right: the first of its operands; code: their number
+    // Over the integers of a range: code: the slot; left, right: the bounds; third: what is asked
+    // of each; constant: whether of every one.
+    Quantifier,
   };
   struct Term {
     Kind kind = Kind::Constant;

@@ -2,7 +2,8 @@
 //
 // Pattern     a function whose body consists of integer and double literals, true() and false(),
 //             its parameters, let variables without a type, arithmetic, comparisons, "and", "or",
-//             not(), conditionals and calls of functions for which the same holds
+//             not(), conditionals, quantifiers over one range and calls of functions for which the
+//             same holds
 // Facts       each variable is read where it is surely set, by a parameter or a clause around it
 // Refused     functions of many parameters and variables, and very long ones
 // Operator    XQueryScalarBody
@@ -10,6 +11,7 @@
 //             numbers do not tell, the body is evaluated as it was written, with the same arguments
 #include "Expr/Clauses/XQueryConditional.h"
 #include "Expr/Clauses/XQueryFLWOR.h"
+#include "Expr/Clauses/XQueryQuantified.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/XQueryLeaves.h"
 #include "Functions/Boolean.h"
@@ -82,6 +84,8 @@ class Compiler {
         return addCall(place, *cast<XQueryFunctionCall>(&expr), level + 1);
       case Kind::ConditionalExpr:
         return addConditional(place, use, level + 1);
+      case Kind::QuantifiedExpr:
+        return addQuantifier(place, *cast<XQueryQuantifiedExpr>(&expr), level + 1);
       case Kind::FLWORExpr:
         return addLets(place, *cast<XQueryFLWORExpr>(&expr), use, level + 1);
       default:
@@ -116,8 +120,8 @@ class Compiler {
     Terms::Term term;
     term.kind = TermKind::Slot;
     if (binder != XQueryNoPlace) {
-      const auto slot = _slotsOfLets.find(binder);
-      if (slot == _slotsOfLets.end()) return {};
+      const auto slot = _slotsOfVariables.find(binder);
+      if (slot == _slotsOfVariables.end()) return {};
       term.code = slot->second;
     } else {
       const auto slot = _slotsOfParameters.find(variable.varID());
@@ -230,19 +234,23 @@ class Compiler {
     for (const auto& clause : flwor.forLet()) {
       if (clause->kind() != Kind::LetExpr || clause->type()) return {};
       const XQueryPlaceID bound = _program.part(part, XQueryRole::Bound);
-      if (bound == XQueryNoPlace || _slots == Terms::mostSlots) return {};
+      if (bound == XQueryNoPlace) return {};
       const Added added = add(bound, Use::Answer, level);
-      if (!added) return {};
+      if (!added || _slots == Terms::mostSlots) return {};
       Terms::Term term;
       term.kind = TermKind::Let;
       term.left = *added;
       term.code = _slots++;
-      _slotsOfLets.emplace(part, term.code);
+      _slotsOfVariables.emplace(part, term.code);
       lets.push_back(term);
       part = _program.nextPart(part);
     }
     const XQueryPlaceID returned = _program.part(place, XQueryRole::Return);
     Added inner = returned == XQueryNoPlace ? Added() : add(returned, use, level);
+    // Read elsewhere it is what was left in it.
+    for (part = _program.firstPart(place); part != XQueryNoPlace; part = _program.nextPart(part)) {
+      _slotsOfVariables.erase(part);
+    }
     for (auto let = lets.rbegin(); inner && let != lets.rend(); ++let) {
       let->right = *inner;
       inner = _into.scalars.add(*let);
@@ -250,12 +258,42 @@ class Compiler {
     return inner;
   }
 
+  // Over the integers of a range.
+  Added addQuantifier(XQueryPlaceID place, const XQueryQuantifiedExpr& quantifier, int level) {
+    if (quantifier.items().size() != 1 || quantifier.items().front()->type()) return {};
+    const XQueryPlaceID clause = _program.firstPart(place);
+    const XQueryPlaceID satisfies = _program.part(place, XQueryRole::Satisfies);
+    const XQueryPlaceID bound =
+        XQueryPlaceInside(_program, _program.part(clause, XQueryRole::Bound));
+    if (bound == XQueryNoPlace || satisfies == XQueryNoPlace) return {};
+    const auto* range = dyn_cast<XQueryOperatorExpr>(_program[bound].expr);
+    if (!range || range->operatorType() != XQueryOperatorTo) return {};
+    const XQueryPlaceID first = _program.firstPart(bound);
+    const XQueryPlaceID last = first == XQueryNoPlace ? first : _program.nextPart(first);
+    if (last == XQueryNoPlace) return {};
+    Terms::Term term;
+    term.kind = TermKind::Quantifier;
+    term.constant = XQueryScalar::ofTruth(quantifier.every());
+    const Added from = add(first, Use::Operand, level);
+    const Added to = from ? add(last, Use::Operand, level) : from;
+    if (!to || _slots == Terms::mostSlots) return {};
+    term.code = _slots++;
+    _slotsOfVariables.emplace(clause, term.code);
+    const Added asked = add(satisfies, Use::Operand, level);
+    _slotsOfVariables.erase(clause);
+    if (!asked) return {};
+    term.left = *from;
+    term.right = *to;
+    term.third = *asked;
+    return _into.scalars.add(term);
+  }
+
   const XQueryPlanning& _planning;
   const XQueryProgram& _program;
   const FunctionIndexes& _functions;
   XQueryScalarBody::Program& _into;
   std::map<int64_t, uint8_t> _slotsOfParameters;
-  std::map<XQueryPlaceID, uint8_t> _slotsOfLets;
+  std::map<XQueryPlaceID, uint8_t> _slotsOfVariables;
   uint8_t _slots = 0;
 };
 

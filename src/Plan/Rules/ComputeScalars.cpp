@@ -1,8 +1,9 @@
 // Arithmetic, comparisons and logic over single numbers.
 //
-// Pattern     an operator of arithmetic, a value or general comparison, "and", "or" and not() over
-//             others of these, local variables, ".", position(), last() and numbers; arithmetic of
-//             one operator alone gains nothing
+// Pattern     an operator of arithmetic, a value or general comparison, "and", "or", not() and
+// calls
+//             of functions of numbers over others of these, local variables, ".", position(),
+//             last() and numbers; arithmetic of one operator alone gains nothing
 // Facts       of a variable and of ".": it may be a number, or untyped in arithmetic; compared, it
 //             or what it is compared with is surely one; and no other rule has put something in the
 //             place of a part
@@ -16,6 +17,7 @@
 #include "Functions/Boolean.h"
 #include "Functions/Context.h"
 #include "Functions/XQueryFunctionCall.h"
+#include "Plan/Operators/XQueryScalarBody.h"
 #include "Plan/Operators/XQueryScalarExpr.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
@@ -34,7 +36,7 @@ using StepKind = XQueryScalarSteps::Kind;
 using Added = std::optional<Steps::Index>;
 
 // What an operand is for; the other side of a comparison may be known to be a number.
-enum class Use : uint8_t { Arithmetic, Comparison, ComparisonWithNumber, Logic };
+enum class Use : uint8_t { Arithmetic, Comparison, ComparisonWithNumber, Logic, Argument };
 
 // The classes of operators, as XQueryOperatorExpr::operatorClassification numbers them.
 constexpr int logicalClass = 1, arithmeticClass = 2, valueClass = 5, generalClass = 6;
@@ -60,6 +62,7 @@ class Compiler {
     if (const auto* literal = dyn_cast<XQueryLiteral>(expr.get())) return addLiteral(*literal, use);
     if (expr.get() != _program[place].expr) return std::nullopt;
     if (const Added leaf = addLeaf(place, *expr, use)) return leaf;
+    if (const Added call = addCall(place, level)) return call;
     return use != Use::Logic && isTruth(*expr) ? std::nullopt : addOperation(place, level);
   }
 
@@ -98,10 +101,40 @@ class Compiler {
     return _steps.add(step);
   }
 
+  // Of a declared function that takes machine numbers, with operands that may be some.
+  Added addCall(XQueryPlaceID place, int level) {
+    const auto* call = dyn_cast<XQueryFunctionCall>(_program[place].expr);
+    if (!call || call->builtIn() || !call->hasBody()) return std::nullopt;
+    const XQueryScalarBody* body = bodyOf(*call->functionDecl());
+    if (!body) return std::nullopt;
+    std::vector<Steps::Index> operands;
+    const XQueryPlaceID list = _program.part(place, XQueryRole::Arguments);
+    for (XQueryPlaceID each = list == XQueryNoPlace ? list : _program.firstPart(list);
+         each != XQueryNoPlace; each = _program.nextPart(each)) {
+      const Added added = addOperand(each, Use::Argument, level + 1);
+      if (!added) return std::nullopt;
+      operands.push_back(*added);
+    }
+    Steps::Step step;
+    step.kind = StepKind::Call;
+    step.code = static_cast<uint8_t>(operands.size());
+    step.left = _steps.addOperands(operands);
+    step.body = body;
+    return _steps.add(step);
+  }
+
+  const XQueryScalarBody* bodyOf(const XQueryFunctionDecl& function) const {
+    const XQueryProgramBody* body = _program.bodyOfFunction(&function);
+    if (!body || body->place == XQueryNoPlace) return nullptr;
+    const Ref<XQueryExpr> expr = _planning.exprAt(XQueryPlaceInside(_program, body->place));
+    const auto* planned = dyn_cast<XQueryPlannedExpr>(expr.get());
+    return planned ? planned->scalarBody() : nullptr;
+  }
+
   static bool fits(const XQueryFacts& facts, Use use) {
     constexpr auto numbers = XQueryItems::Integer | XQueryItems::Double;
     if (use == Use::Comparison) return facts.are(XQueryItems::Numeric) && facts.mayBe(numbers);
-    if (use == Use::ComparisonWithNumber) return facts.mayBe(numbers);
+    if (use == Use::ComparisonWithNumber || use == Use::Argument) return facts.mayBe(numbers);
     return facts.mayBe(numbers | XQueryItems::Untyped | XQueryItems::Node);
   }
 
@@ -122,6 +155,7 @@ class Compiler {
     constexpr int mostLevels = 16;
     if (level > mostLevels) return std::nullopt;
     const Ref<XQueryExpr> expr = _planning.exprAt(place);
+    if (const Added called = addCall(place, level)) return called;
     if (const auto* call = dyn_cast<XQueryFunctionCall>(expr.get())) {
       const bool isNot = call->builtIn() && call->function() == fn_not && call->args() &&
                          call->args()->count() == 1;
