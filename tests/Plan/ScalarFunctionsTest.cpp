@@ -194,7 +194,9 @@ TEST(ScalarFunctions, AnswerTheSameObjects) {
        {"(1 to 4)/local:f(.)", "let $l := (1, 2, 3, 1) return ($l/local:f(.), $l)",
         "(local:f(1), local:f(1), local:f(7))/.", "let $x := 7 return ($x, local:f($x))/.",
         "let $x := 5e0 return (local:f($x), local:f($x), $x)/.",
-        "(local:f(local:f(7)), local:f(8))/."}) {
+        "(local:f(local:f(7)), local:f(8))/.", "(1 to 4)/local:f(7)", "(1 to 4)/local:f(1)",
+        "(for $i in 1 to 4 return local:f(7e0))/.",
+        "(for $i in 1 to 4 return (local:f($i), local:f(5), local:f(5 + 0)))/."}) {
     for (const char* body :
          {"if ($n < 3) then 1 else $n", "if ($n < 3) then 1 else $n + 0", "let $m := 2 return $m",
           "if ($n > 100) then $n else if ($n > 3) then local:f($n + 100) else $n",

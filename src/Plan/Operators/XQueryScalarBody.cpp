@@ -26,12 +26,18 @@ Value XQueryScalarBody::valueOf(const XQueryScalar& answer, XQueryContext& conte
     case XQueryScalar::Truth:
       return NSNumber::numberWithBool(answer.truth);
     case XQueryScalar::Object:
-      for (const auto& literal : _program->literals) {
-        if (literal->literalValue() == answer.object) return literal->computeValue(context);
-      }
+      if (Value literal = literalAnswered(answer, context)) return literal;
       return const_cast<NSObject*>(answer.object);
     case XQueryScalar::Unknown:
       break;
+  }
+  return {};
+}
+
+Value XQueryScalarBody::literalAnswered(const XQueryScalar& answer, XQueryContext& context) const {
+  if (answer.form != XQueryScalar::Object) return {};
+  for (const auto& literal : _program->literals) {
+    if (literal->literalValue() == answer.object) return literal->computeValue(context);
   }
   return {};
 }

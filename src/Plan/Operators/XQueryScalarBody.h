@@ -36,7 +36,8 @@ class XQueryScalarBody : public XQueryPlannedExpr {
   // What the function answers for these arguments, which are overwritten; Unknown where the body
   // has to be evaluated. Throws where a limit of the evaluation is reached.
   XQueryScalar answer(XQueryScalar* arguments) const;
-  size_t parameterCount() const { return _parameters.size(); }
+  // The literal that was answered; null for another answer.
+  Value literalAnswered(const XQueryScalar& answer, XQueryContext& context) const;
   // Of an argument: Unknown for what is neither a number nor a truth value.
   static XQueryScalar scalarOf(const NSObject* argument);
 

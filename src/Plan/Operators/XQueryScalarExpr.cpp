@@ -22,8 +22,12 @@ Scalar placeInFocus(int64_t number) {
 }  // namespace
 
 XQueryScalar XQueryScalarSteps::answer(const XQueryContext& context) const {
-  const Scalar last = valueOf(static_cast<Index>(_steps.size() - 1), _internal(context));
+  const Scalar last = answerOrObject(context);
   return last.form == Form::Object ? Scalar() : last;
+}
+
+XQueryScalar XQueryScalarSteps::answerOrObject(const XQueryContext& context) const {
+  return valueOf(static_cast<Index>(_steps.size() - 1), _internal(context));
 }
 
 // Most operands are at hand: they are taken in place.
@@ -93,7 +97,7 @@ XQueryScalar XQueryScalarSteps::logic(const Step& step,
 }
 
 Value XQueryScalarExpr::computeValue(XQueryContext& context) const {
-  const Scalar answer = _steps.answer(context);
+  const Scalar answer = _steps.answerOrObject(context);
   switch (answer.form) {
     case Form::Integer:
       return XQueryNumber::integerWithInt64(answer.integer);
@@ -101,6 +105,11 @@ Value XQueryScalarExpr::computeValue(XQueryContext& context) const {
       return XQueryNumber::numberWithDouble(answer.number);
     case Form::Truth:
       return NSNumber::numberWithBool(answer.truth);
+    case Form::Object:
+      if (const auto* callee = _steps.callee()) {
+        if (Value literal = callee->literalAnswered(answer, context)) return literal;
+      }
+      return plain().evaluateWithContext(context);
     default:
       return plain().evaluateWithContext(context);
   }

@@ -70,6 +70,10 @@ class XQueryScalarSteps {
   // What the last step comes to; Unknown, among others, for an object. Throws where a call reaches
   // a limit of the evaluation.
   XQueryScalar answer(const XQueryContext& context) const;
+  // The same where an object is wanted as well, of which there is more to be known.
+  XQueryScalar answerOrObject(const XQueryContext& context) const;
+  // The body of the function that is called last, if the last step is a call; otherwise null.
+  const XQueryScalarBody* callee() const { return _steps.back().body; }
 
  private:
   XQueryScalar valueOf(Index index, const XQueryContextInternal& context) const;

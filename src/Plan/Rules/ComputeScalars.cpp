@@ -68,8 +68,13 @@ class Compiler {
 
   Added addLiteral(const XQueryLiteral& literal, Use use) {
     if (use == Use::Logic || !literal.literalValue()) return std::nullopt;
-    const auto number = XQueryNumericOperand::of(literal.literalValue().get(), false);
     Steps::Step step;
+    if (use == Use::Argument) {
+      // A function may answer an argument, and which object that is can be told.
+      step.constant = XQueryScalar::ofObject(literal.literalValue().get());
+      return _steps.add(step);
+    }
+    const auto number = XQueryNumericOperand::of(literal.literalValue().get(), false);
     if (number.form == XQueryNumericOperand::Double) {
       step.constant = XQueryScalar::ofDouble(number.number);
     } else if (number.form == XQueryNumericOperand::Exact && number.isInteger &&
