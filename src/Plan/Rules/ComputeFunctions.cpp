@@ -45,9 +45,9 @@ using FunctionIndexes = std::map<const XQueryFunctionDecl*, Terms::Index>;
 // Adds the terms of one function.
 class Compiler {
  public:
-  Compiler(const XQueryPlanning& planning, const FunctionIndexes& functions,
+  Compiler(const XQueryProgram& program, const FunctionIndexes& functions,
            XQueryScalarBody::Program& into)
-      : _planning(planning), _program(planning.program), _functions(functions), _into(into) {}
+      : _program(program), _functions(functions), _into(into) {}
 
   std::optional<Terms::Function> functionOf(const XQueryProgramBody& body) {
     Terms::Function function;
@@ -288,7 +288,6 @@ class Compiler {
     return _into.scalars.add(term);
   }
 
-  const XQueryPlanning& _planning;
   const XQueryProgram& _program;
   const FunctionIndexes& _functions;
   XQueryScalarBody::Program& _into;
@@ -324,7 +323,7 @@ class Search {
     std::vector<Terms::Function> functions;
     const size_t count = _bodies.size();
     std::erase_if(_bodies, [&](const XQueryProgramBody* body) {
-      const auto function = Compiler(_planning, indexes, *_compiled).functionOf(*body);
+      const auto function = Compiler(_planning.program, indexes, *_compiled).functionOf(*body);
       if (function) functions.push_back(*function);
       return !function;
     });
