@@ -17,6 +17,7 @@ static_assert(sizeof(Value) == sizeof(void*));
 constexpr size_t bytesPerStep = 65536;
 
 void moveItems(std::vector<Value>& items, size_t from, size_t to, size_t count) {
+  if (count == 0) return;
   checkWork(count * sizeof(Value) / bytesPerStep);
   void* const target = items.data() + to;
   std::memmove(target, items.data() + from, count * sizeof(Value));
@@ -24,6 +25,7 @@ void moveItems(std::vector<Value>& items, size_t from, size_t to, size_t count) 
 
 // For places whose references have been moved elsewhere.
 void makeNull(std::vector<Value>& items, size_t first, size_t count) {
+  if (count == 0) return;
   void* const target = items.data() + first;
   std::memset(target, 0, count * sizeof(Value));
 }
