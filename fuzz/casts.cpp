@@ -6,6 +6,7 @@
 #include "support/QueryWords.h"
 #include "xquery/xquery.h"
 
+#include <cmath>
 #include <cstdlib>
 #include <string>
 #include <vector>
@@ -112,6 +113,14 @@ bool isUnreadable(std::string_view name, std::string_view form) {
   return name.ends_with("ration") && form.find('e') != form.npos;
 }
 
+// A dayTimeDuration is a double of seconds: from 2 to the 53rd on it has no units any more, and
+// what its days, hours and minutes come to is rounded at each of them.
+bool hasNoUnits(std::string_view name, const Value& value) {
+  if (name != "xdt:dayTimeDuration") return false;
+  const auto seconds = XQueryReadDayTimeDuration(value);
+  return !seconds || std::fabs(seconds->count()) >= 9007199254740992.0;
+}
+
 // 59.9999999 seconds print as 60.000000, and are read as the next minute.
 bool isRoundedUp(std::string_view name, std::string_view form) {
   return name.ends_with("ime") && form.find(".000000") != form.npos;
@@ -139,6 +148,7 @@ void checkForm(size_t type, const Value& value) {
   check(again.isValue() != isUnreadable(name, form),
         std::string(name) + ": a form that is none of the type, or is none and is read", form);
   if (!again.isValue() || isRoundedUp(name, form) || losesZeros(name, form)) return;
+  if (hasNoUnits(name, value)) return;
   checkEqual(XQueryItemStringValue(*again.value), form, "read back otherwise");
 }
 

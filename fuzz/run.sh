@@ -3,7 +3,8 @@
 # named or all, each for so many minutes (fractions are allowed). XQUERY_FUZZ_JOBS says how many
 # of them run at a time, one unless given. What makes one fail is kept under
 # build/fuzz/found/TARGET, what it has learnt under build/fuzz/corpus/TARGET for the next run;
-# XQUERY_FUZZ_CORPUS names another folder for that. The status is 1 when something was found: mend it,
+# XQUERY_FUZZ_CORPUS names another folder for that. XQUERY_FUZZ_SEED is the number that the choices
+# begin with, another one in each run unless given: the same number goes the same way. The status is 1 when something was found: mend it,
 # and keep its smallest form as a seed.
 set -u
 . "$(dirname "${BASH_SOURCE[0]}")/../cmake/prepare.sh"
@@ -29,7 +30,7 @@ run_target() {
   local log=$out/$target.log
   mkdir -p "$found" "$corpus" "seeds/$target"
   local options=(-max_total_time="$seconds" -timeout=30 -rss_limit_mb=3000 -print_final_stats=1
-    -artifact_prefix="$found/")
+    -seed="${XQUERY_FUZZ_SEED:-0}" -artifact_prefix="$found/")
   [ -f "dictionaries/$target.txt" ] && options+=(-dict="dictionaries/$target.txt")
   if "$top/build/asan/fuzz_$target" "${options[@]}" "$corpus" "seeds/$target" >"$log" 2>&1; then
     echo "== $target, for $seconds s: $(awk '/number_of_executed_units/ { print $2 }' "$log") inputs"
