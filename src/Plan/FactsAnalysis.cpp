@@ -150,8 +150,14 @@ const XQueryFacts& XQueryFactTable::ofFunction(const XQueryFunctionDecl* functio
 bool XQueryFactTable::isSurelySet(XQueryPlaceID variable) const {
   const XQueryPlaceID binder = _program[variable].binder;
   if (binder == XQueryNoPlace) return false;
-  if (_program[binder].expr->kind() != Kind::QuantifiedItem) return true;
-  return variable < _program[_program[binder].parent].end && setsSurely(binder);
+  switch (_program[binder].expr->kind()) {
+    case Kind::QuantifiedItem:
+      return variable < _program[_program[binder].parent].end && setsSurely(binder);
+    case Kind::CaseClause:
+      return variable < _program[binder].end;
+    default:
+      return true;
+  }
 }
 
 // It is not set when its clause had no items: the next one is tried in its place. The condition is

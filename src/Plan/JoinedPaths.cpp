@@ -148,7 +148,9 @@ class Joining {
       if (const auto* variable = dyn_cast<XQueryVariable>(at(place).expr)) {
         if (at(place).binder != XQueryNoPlace) _uses[at(place).binder].push_back(place);
         if (variable->varID() == 0) noteGlobal(place, *variable);
-        if (place >= mainPlace() && !_facts.isSurelySet(place)) _unset.insert(variable->varID());
+        if (_facts.isSurelySet(place)) continue;
+        _unsetAnywhere.add(variable->varID());
+        if (place >= mainPlace()) _unset.insert(variable->varID());
       } else if (const auto* call = dyn_cast<XQueryFunctionCall>(at(place).expr)) {
         if (call->functionDecl()) _calls[call->functionDecl()].push_back(place);
         const auto* builtIn = call->builtIn();
@@ -196,13 +198,22 @@ class Joining {
            XQueryIsEvaluatedOnce(_program, at(predicate).parent);
   }
 
+  // Whether nobody can tell of which nodes, and in which order, the predicate is asked.
+  bool isIdle(XQueryPlaceID predicate) const {
+    const XQueryFacts& facts = _facts[predicate];
+    return facts.isRepeatable() && !facts.assigns.meets(_unsetAnywhere) &&
+           !facts.assigns.meets(facts.reads);
+  }
+
   // Whether nobody can tell which step of the path the predicates of its start are asked by, and
   // that its steps go on from another one. What is repeatable gives no node a parent.
   bool goesOn(XQueryPlaceID path, const XQueryStep& start) const {
     size_t count = 0;
     for (XQueryPlaceID part = _program.firstPart(path); part != XQueryNoPlace;
          part = _program.nextPart(part)) {
-      if (at(part).role != XQueryRole::Predicate || at(part).step != &start) continue;
+      if (at(part).role != XQueryRole::Predicate) continue;
+      if (!isIdle(part)) return false;
+      if (at(part).step != &start) continue;
       if (!isFound(part)) return false;
       ++count;
     }
@@ -392,6 +403,7 @@ class Joining {
   std::unordered_map<XQueryPlaceID, Places> _uses;  // of variables, by clause
   std::unordered_map<Ref<XQueryQName>, Places, XQueryQNameHash, XQueryQNameEqual> _ofGlobals;
   std::unordered_set<int64_t> _unset;  // variables that the body of the query may read unset
+  XQueryVariableSet _unsetAnywhere;    // the same for all bodies, with their parameters
   std::unordered_map<const XQueryFunctionDecl*, Places> _calls;
   bool _mayDeclare = false;
 };

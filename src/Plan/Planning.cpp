@@ -42,6 +42,19 @@ XQueryPlanning::XQueryPlanning(XQueryProgram& ofProgram)
     }
     _unset.push_back(unset);
   }
+  shareFrame();
+}
+
+// The body of the query and the global variables have one frame: what one of them leaves, another
+// one may read.
+void XQueryPlanning::shareFrame() {
+  XQueryVariableSet shared;
+  for (size_t body = 0; body < _unset.size(); ++body) {
+    if (!program.bodies()[body].function) shared.add(_unset[body]);
+  }
+  for (size_t body = 0; body < _unset.size(); ++body) {
+    if (!program.bodies()[body].function) _unset[body] = shared;
+  }
 }
 
 bool XQueryPlanning::showsLeftovers(const XQueryVariableSet& variables, XQueryPlaceID place) const {

@@ -44,7 +44,7 @@ class XQueryPlanning {
   // the same are two items of a path's results, and two items of a host.
   bool showsIdentity(XQueryPlaceID place) const;
 
-  // Whether one of these variables may be read in the same body where nothing has set it, so that
+  // Whether one of these variables may be read in the same frame where nothing has set it, so that
   // what was left in it can be told.
   bool showsLeftovers(const XQueryVariableSet& variables, XQueryPlaceID place) const;
 
@@ -73,6 +73,8 @@ class XQueryPlanning {
 
  private:
   enum class State : uint8_t { AsWritten, Wrapped, Gone };
+
+  void shareFrame();
 
   void note(XQueryPlaceID place, bool isRefusal, std::string_view text);
 

@@ -197,17 +197,6 @@ XQueryPlaceID XQueryProgram::withoutParentheses(XQueryPlaceID place) const {
   return place;
 }
 
-// A quantifier's variable is not set when its clause had no items, but for the last one while the
-// condition is asked: that is asked for an item of the last clause only.
-bool XQueryProgram::isSurelySet(XQueryPlaceID variable) const {
-  const XQueryPlaceID binder = _places[variable].binder;
-  if (binder == XQueryNoPlace) return false;
-  if (_places[binder].expr->kind() != Kind::QuantifiedItem) return true;
-  const XQueryPlaceID whole = _places[binder].parent;
-  const auto& items = cast<XQueryQuantifiedExpr>(_places[whole].expr)->items();
-  return variable < _places[whole].end && _places[binder].expr == items.back().get();
-}
-
 Ref<XQueryExpr> XQueryProgram::install() {
   Ref<XQueryExpr> main;
   for (XQueryProgramBody& body : _bodies) {

@@ -94,8 +94,6 @@ class XQueryProgram {
 
   // What stands there in parentheses, however many; the place itself for anything else.
   XQueryPlaceID withoutParentheses(XQueryPlaceID place) const;
-  // Whether the local variable that is read there has been set, whatever happened before.
-  bool isSurelySet(XQueryPlaceID variable) const;
 
   // Puts an expression in the place of another one. The list of places stays as it is: it tells of
   // the expressions as they were written, which live as long as it does.

@@ -79,6 +79,7 @@ class ProgramGenerator {
   std::string growingTree(int depth);
   std::string call(int depth);
   std::string other(int depth);
+  std::string typeswitch(int depth);
 
   // Lists long enough for a table, mostly.
   std::string many();

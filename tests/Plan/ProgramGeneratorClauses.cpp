@@ -106,16 +106,21 @@ std::string ProgramGenerator::call(int depth) {
   return functions[_random.below(functions.size())] + "(" + expr(depth - 1) + ")";
 }
 
+// The variable of a case can be read behind it, where something may have been left in its place.
+std::string ProgramGenerator::typeswitch(int depth) {
+  const std::string text = "(typeswitch (" + expr(depth - 1) + ") case $t as element() return " +
+                           within("$t", [&] { return expr(depth - 1); }) + " default return " +
+                           (_random.below(4) == 0 ? "$t" : expr(depth - 1)) + ")";
+  return _random.below(4) == 0 ? "(" + text + ", $t)" : text;
+}
+
 std::string ProgramGenerator::other(int depth) {
   switch (_random.below(5)) {
     case 0:
       return "(if (" + comparison(depth - 1) + ") then " + expr(depth - 1) + " else " +
              expr(depth - 1) + ")";
-    case 1: {
-      const std::string text = "typeswitch (" + expr(depth - 1) + ") case $t as element() return ";
-      return "(" + text + within("$t", [&] { return expr(depth - 1); }) + " default return " +
-             expr(depth - 1) + ")";
-    }
+    case 1:
+      return typeswitch(depth);
     case 2:
       return "(" + expr(depth - 1) + _random.oneOf({" | ", " intersect ", " except "}) +
              path(depth - 1) + ")";

@@ -223,7 +223,7 @@ class Analysis : private XQueryDocumentAnalysis<XQueryProjectionPlan> {
     const XQueryPlaceID binder = _program[place].binder;
     if (varID == 0) return {};
     const auto found = _variables.find(binder);
-    if (found == _variables.end() || !_program.isSurelySet(place)) {
+    if (found == _variables.end() || !_facts.isSurelySet(place)) {
       refuse(place, "it is not known what the variable holds");
     }
     const auto* forClause = dyn_cast<XQueryForExpr>(exprAt(binder));

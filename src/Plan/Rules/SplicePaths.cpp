@@ -2,8 +2,9 @@
 //
 // Pattern     (P)/a, ((P))//a[b], (P | Q)/a and (P, Q)/a where rules have made one path of the two
 // Facts       P begins at the document and consists of axis steps without predicates, whose names
-//             raise nothing; the steps behind it are axis steps that construct nothing; results are
-//             sorted
+//             raise nothing; the steps behind it are axis steps that construct nothing, whose
+//             predicates are repeatable and leave nothing in variables that can be told; results
+//             are sorted
 // Operator    none: the outer path takes the steps of P before its own, so that the index of the
 //             tree knows the way from the document to what they lead to
 // Why         each step is taken from every node that the steps before it find, and the results,
@@ -32,6 +33,22 @@ bool canBeSpliced(const XQueryWalkedPath& path) {
   });
 }
 
+// Whether nobody can tell of which nodes a predicate was asked first, and how often.
+bool areIdlePredicates(const XQueryPlanning& planning, XQueryPlaceID place) {
+  const XQueryProgram& program = planning.program;
+  XQueryVariableSet reads;
+  XQueryVariableSet assigns;
+  for (XQueryPlaceID part = program.firstPart(place); part != XQueryNoPlace;
+       part = program.nextPart(part)) {
+    if (program[part].role != XQueryRole::Predicate) continue;
+    const XQueryFacts& facts = planning.facts[part];
+    if (!facts.isRepeatable() || planning.showsLeftovers(facts.assigns, place)) return false;
+    reads.add(facts.reads);
+    assigns.add(facts.assigns);
+  }
+  return !reads.meets(assigns);
+}
+
 }  // namespace
 
 void XQuerySplicePath(XQueryPlanning& planning, XQueryPlaceID place) {
@@ -45,6 +62,7 @@ void XQuerySplicePath(XQueryPlanning& planning, XQueryPlaceID place) {
   XQueryWalkedPath* inner = XQueryWalkedPathAt(planning, inside);
   if (!inner || planning.isWrapped(inside) || !canBeSpliced(*inner)) return;
   if (!std::all_of(path->steps().begin(), path->steps().end(), isPlain)) return;
+  if (!areIdlePredicates(planning, place)) return;
   path->takeSteps(*inner);
   planning.leaveOut(first);
   planning.choose(place);
