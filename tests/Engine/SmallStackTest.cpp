@@ -154,6 +154,23 @@ TEST(SmallStack, APatternOfManyGroupsIsCompiledOrAnError) {
 }
 
 // What a host nests is given back without recursion.
+// A chain of them is one condition, however long it is.
+TEST(SmallStack, AnyNumberOfConditionsIsAskedOfANode) {
+  constexpr size_t count = 10'000;
+  const std::string queries[] = {
+      "count(<r><a x='7'/></r>//a[@x != '5'" + repeated(" and @x != '5'", count) + "])",
+      "count(<r><a x='7'/></r>//a[@x = '5'" + repeated(" or @x = '5'", count) + " or @x])",
+      "count(<r><a/></r>//*[name() = 'b'" + repeated(" or name() = 'b'", count) + " or not(@x)])",
+      "let $l := <r><a x='7'/></r>/a for $a in $l return count($l[@x != '5'" +
+          repeated(" and @x != '5'", count) + "])",
+  };
+  for (const size_t size : sizes) {
+    for (const std::string& query : queries) {
+      EXPECT_EQ(outcomeOn(size, query), "1") << size << " " << query.substr(0, 40);
+    }
+  }
+}
+
 TEST(SmallStack, ValuesNestedDeeplyAreGivenBack) {
   for (const size_t size : sizes) {
     onStack(size, [] {

@@ -1,7 +1,11 @@
 // The rules about paths, each: where it takes over, where it does not, and that nobody can tell.
 #include "Expr/Paths/XQueryPath.h"
+#include "Expr/RandomChoices.h"
 #include "Plan/Paths/XQueryWalkedPath.h"
 #include "Plan/RulesTesting.h"
+
+#include <functional>
+#include <iterator>
 
 namespace xquery {
 namespace {
@@ -365,6 +369,44 @@ TEST(JoinConditions, TakesOverWhatCanBeAskedOfANode) {
                         std::string("declare variable $g external; //a[") + condition + "]"),
               0U)
         << condition;
+  }
+}
+
+// Chains within chains, with conditions that only evaluating tells.
+TEST(JoinConditions, AreJoinedInAnyForm) {
+  constexpr const char* leaves[] = {"b",        "@x",           "@x = '1'",    "@x > 1",
+                                    "not(@y)",  "name() = 'a'", "ancestor::c", "string(@x)",
+                                    "count(b)", "b = 't'",      "@x > 'u'",    "self::b"};
+  const std::function<std::string(RandomChoices&, int)> condition = [&](RandomChoices& random,
+                                                                        int depth) {
+    if (depth == 0 || random.below(4) == 0)
+      return std::string(leaves[random.below(std::size(leaves))]);
+    if (random.below(4) == 0) return "not(" + condition(random, depth - 1) + ")";
+    const std::string joint = random.oneOf({" and ", " or "});
+    std::string text = "(" + condition(random, depth - 1);
+    for (size_t count = random.below(4); count > 0; --count) {
+      text += joint + condition(random, depth - 1);
+    }
+    return text + ")";
+  };
+  for (unsigned seed = 0; seed < 300; ++seed) {
+    RandomChoices random(seed);
+    const std::string text = condition(random, 1 + static_cast<int>(seed % 4));
+    resultOf("//node()[" + text + "]", names());
+    resultOf("let $l := //* for $e in $l where $e[" + text + "] return count($l[" + text + "])",
+             names());
+  }
+}
+
+// Nested further than they are asked of a node, and chains as long as queries are.
+TEST(JoinConditions, CostNoMoreTheDeeperTheyAre) {
+  std::string nested = "@x > 'u'";
+  std::string chain = "@x > 'u'";
+  for (int i = 0; i < 100; ++i) nested = (i % 2 != 0 ? "(b and " : "not(b or ") + nested + ")";
+  for (int i = 0; i < 5000; ++i) chain += i % 7 == 0 ? " and @x > 'u'" : " and not(@z)";
+  for (const std::string& condition : {nested, chain}) {
+    EXPECT_GE(choicesOf("conditions", "//a[" + condition + "]"), 1U);
+    resultOf("//node()[" + condition + "]", names());
   }
 }
 

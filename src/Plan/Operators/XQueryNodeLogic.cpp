@@ -1,24 +1,35 @@
 #include "Plan/Operators/XQueryNodeLogic.h"
 
 #include "Context/XQueryContextInternal.h"
+#include "Platform/Base/WorkMeter.h"
 #include "xquery/Number.h"
+
+#include <algorithm>
 
 namespace xquery {
 
-// The operand behind one that decides is not asked, as it would not be evaluated.
-std::optional<bool> XQueryNodeLogic::holdsFor(NSXMLNode* node, const XQueryContext& context) const {
-  const auto first = _operands.front()->nodeQuestion()->holdsFor(node, context);
-  if (!first || _joint == Joint::Not) return first ? std::optional(!*first) : first;
-  if (*first == (_joint == Joint::Or)) return first;
-  return _operands.back()->nodeQuestion()->holdsFor(node, context);
+XQueryNodeLogic::XQueryNodeLogic(Ref<XQueryExpr> plain, Joint joint,
+                                 std::vector<Ref<XQueryPlannedExpr>> operands)
+    : XQueryPlannedExpr(std::move(plain)), _joint(joint), _operands(std::move(operands)) {
+  if (_joint != Joint::And) return;
+  const auto found = std::find_if(_operands.begin(), _operands.end(), [](const auto& operand) {
+    return operand->nodeQuestion()->asksForNodeAbove();
+  });
+  if (found != _operands.end()) _ofNodeAbove = (*found)->nodeQuestion();
 }
 
-const XQueryNodeQuestion* XQueryNodeLogic::questionOfNodeAbove() const {
-  if (_joint != Joint::And) return nullptr;
+// The operands behind one that decides are not asked, as they would not be evaluated.
+std::optional<bool> XQueryNodeLogic::holdsFor(NSXMLNode* node, const XQueryContext& context) const {
+  const bool decides = _joint == Joint::Or;
+  WorkPacer pacer;
   for (const auto& operand : _operands) {
-    if (operand->nodeQuestion()->asksForNodeAbove()) return operand->nodeQuestion();
+    pacer.turn();
+    const auto answer = operand->nodeQuestion()->holdsFor(node, context);
+    if (!answer) return answer;
+    if (_joint == Joint::Not) return !*answer;
+    if (*answer == decides) return decides;
   }
-  return nullptr;
+  return !decides;
 }
 
 Value XQueryNodeLogic::computeValue(XQueryContext& context) const {

@@ -15,7 +15,8 @@ class XQueryNodeLogic : public XQueryPlannedExpr, private XQueryNodeQuestion {
  public:
   enum class Joint : uint8_t { And, Or, Not };
 
-  // Two operands, or one for Not; all of them are node questions.
+  // Any number of operands, of a whole chain of the same joint, or one for Not; all of them are
+  // node questions.
   [[nodiscard]] static Ref<XQueryNodeLogic> exprWithPlain(
       Ref<XQueryExpr> plain, Joint joint, std::vector<Ref<XQueryPlannedExpr>> operands) {
     return make<XQueryNodeLogic>(std::move(plain), joint, std::move(operands));
@@ -26,23 +27,20 @@ class XQueryNodeLogic : public XQueryPlannedExpr, private XQueryNodeQuestion {
   const XQueryNodeQuestion* nodeQuestion() const override { return this; }
 
  protected:
-  XQueryNodeLogic(Ref<XQueryExpr> plain, Joint joint, std::vector<Ref<XQueryPlannedExpr>> operands)
-      : XQueryPlannedExpr(std::move(plain)), _joint(joint), _operands(std::move(operands)) {}
+  XQueryNodeLogic(Ref<XQueryExpr> plain, Joint joint, std::vector<Ref<XQueryPlannedExpr>> operands);
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
  private:
   std::optional<bool> holdsFor(NSXMLNode* node, const XQueryContext& context) const override;
-  bool asksForNodeAbove() const override { return questionOfNodeAbove() != nullptr; }
+  bool asksForNodeAbove() const override { return _ofNodeAbove != nullptr; }
   const NSXMLNode* nodeAbove(const XQueryContext& context) const override {
-    const XQueryNodeQuestion* question = questionOfNodeAbove();
-    return question ? question->nodeAbove(context) : nullptr;
+    return _ofNodeAbove ? _ofNodeAbove->nodeAbove(context) : nullptr;
   }
-  // Of those that have to hold.
-  const XQueryNodeQuestion* questionOfNodeAbove() const;
 
   const Joint _joint;
   const std::vector<Ref<XQueryPlannedExpr>> _operands;
+  const XQueryNodeQuestion* _ofNodeAbove = nullptr;  // one of those that have to hold
 };
 
 }  // namespace xquery
