@@ -158,9 +158,10 @@ struct XQueryScalarProgram::Run {
     int64_t distance = 0;
     const bool isFar = __builtin_sub_overflow(last.integer, first.integer, &distance);
     if (isFar || distance > mostIntegers) return {};
-    for (int64_t each = first.integer; each <= last.integer; ++each) {
+    // Counted by distance: the last integer may be the greatest there is.
+    for (int64_t offset = 0; offset <= distance; ++offset) {
       checkWork();
-      slots[term.code] = Scalar::ofInteger(each);
+      slots[term.code] = Scalar::ofInteger(first.integer + offset);
       const Scalar holds = XQueryScalarTruth(value(program._terms[term.third], slots));
       if (holds.form == Form::Unknown || holds.truth != ofEvery) return holds;
     }

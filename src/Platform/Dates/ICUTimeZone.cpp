@@ -112,7 +112,7 @@ class RuleReader {
     _text.remove_prefix(static_cast<size_t>(end - _text.data()));
     return true;
   }
-  // [+-]hh[:mm[:ss]]
+  // [+-]hh[:mm[:ss]], no more than a day.
   bool seconds(int& out) {
     const bool negative = take('-');
     if (!negative) take('+');
@@ -122,6 +122,7 @@ class RuleReader {
       return false;
     }
     out = out * 3600 + minutes * 60 + rest;
+    if (out > secondsPerDay) return false;
     if (negative) out = -out;
     return true;
   }
@@ -140,8 +141,7 @@ bool readYearlyRule(RuleReader& reader, YearlyRule& rule) {
   return reader.take(',') && reader.take('M') && reader.number(rule.month) && reader.take('.') &&
          reader.number(rule.week) && reader.take('.') && reader.number(rule.weekday) &&
          (!reader.take('/') || reader.seconds(rule.time)) && rule.month >= 1 && rule.month <= 12 &&
-         rule.week >= 1 && rule.week <= 5 && rule.weekday <= 6 && rule.time >= 0 &&
-         rule.time <= 86400;
+         rule.week >= 1 && rule.week <= 5 && rule.weekday <= 6 && rule.time >= 0;
 }
 
 // Null for a text that is no such rule. Without dates the daylight saving of the United States

@@ -184,6 +184,11 @@ TEST_F(LocalTimeZone, MayBeGivenAsARule) {
   EXPECT_IN_ZONE("AAA5BBB,J60,J300", localOffsets(), "-300 -300");
   EXPECT_IN_ZONE("AAA", localOffsets(), "0 0");
   EXPECT_IN_ZONE("AAA99999999999", localOffsets(), "0 0");
+  // No further from Greenwich than a day.
+  EXPECT_IN_ZONE("AAA24", localOffsets(), "-1440 -1440");
+  EXPECT_IN_ZONE("AAA24:00:01", localOffsets(), "0 0");
+  EXPECT_IN_ZONE("AAA597", localOffsets(), "0 0");
+  EXPECT_IN_ZONE("AAA1BBB999", localOffsets(), "0 0");
 }
 
 std::string minutesAround(int64_t change) {
