@@ -17,6 +17,8 @@ constexpr std::array rules = {
                XQueryTakePositions},
     XQueryRule{"ranges", "the items from one position to another are taken without asking each",
                XQueryTakePositionRanges},
+    XQueryRule{"ends", "conditions in front of a position are asked no further than that",
+               XQueryEndWithPositions},
     XQueryRule{"walks", "no node is walked twice, and no further than needed", XQueryKeepTrails},
     XQueryRule{"constants", "what consists of literals alone is evaluated once, beforehand",
                XQueryFoldConstants},

@@ -30,6 +30,7 @@ void XQueryMovePaths(XQueryPlanning& planning);
 void XQuerySplicePaths(XQueryPlanning& planning);
 void XQueryTakePositions(XQueryPlanning& planning);
 void XQueryTakePositionRanges(XQueryPlanning& planning);
+void XQueryEndWithPositions(XQueryPlanning& planning);
 void XQueryCompareNames(XQueryPlanning& planning);
 void XQueryKeepInvariants(XQueryPlanning& planning);
 void XQueryCompareEarlierItems(XQueryPlanning& planning);

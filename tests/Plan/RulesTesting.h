@@ -21,7 +21,8 @@ inline size_t operatorsIn(std::string_view text) {
       "texts",      "short paths",      "constants",      "counts",     "sets",
       "walks",      "operands",         "constructors",   "lists",      "nearby nodes",
       "one by one", "ranges",           "paths in paths", "set counts", "loop counts",
-      "stretches",  "early conditions", "set filters",    "way counts", "moved paths"};
+      "stretches",  "early conditions", "set filters",    "way counts", "moved paths",
+      "ends"};
   return choicesIn(text, [](std::string_view rule) {
     return !others.contains(rule) && !rule.ends_with("-joins");
   });

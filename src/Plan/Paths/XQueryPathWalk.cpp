@@ -7,6 +7,7 @@
 #include "Expr/XQuerySequence.h"
 #include "Plan/Operators/XQueryNodeQuestion.h"
 #include "Plan/Operators/XQueryPlannedExpr.h"
+#include "Plan/Paths/XQueryConditionFilter.h"
 #include "Plan/Paths/XQueryIndexedWalk.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
@@ -272,6 +273,11 @@ bool XQueryPathWalk::filterNodes(const XQueryWalkedStep& step, size_t fromIndex,
                                  std::vector<NSXMLNode*>& nodes) {
   const auto& predicates = step.step->predicates();
   for (size_t index = fromIndex; index < predicates.size(); ++index) {
+    if (index == step.positions.conditions.first) {
+      index = keepUpToPosition(step, nodes) - 1;
+      if (hasFailed) return false;
+      continue;
+    }
     if (index == step.positions.fromBack.predicate) {
       const uint64_t behind = step.positions.fromBack.behind;
       const bool isThere = behind < nodes.size();
@@ -290,6 +296,24 @@ bool XQueryPathWalk::filterNodes(const XQueryWalkedStep& step, size_t fromIndex,
     if (!keepNodes(*predicates[index], *question, nodes)) return false;
   }
   return true;
+}
+
+// Asks conditions no further than the position goes that is asked for behind them. Answers how many
+// predicates are dealt with.
+size_t XQueryPathWalk::keepUpToPosition(const XQueryWalkedStep& step,
+                                        std::vector<NSXMLNode*>& nodes) {
+  XQueryConditionFilter filter(*step.step, step.positions, context);
+  WorkPacer pacer;
+  size_t kept = 0;
+  for (size_t i = 0; i < nodes.size() && !filter.isOver(); ++i) {
+    pacer.turn();
+    const size_t at = filter.goesBackwards() ? nodes.size() - 1 - i : i;
+    NSXMLNode* node = nodes[at];
+    if (filter.keeps(node, static_cast<int64_t>(at) + 1)) nodes[kept++] = node;
+  }
+  hasFailed = filter.hasFailed();
+  nodes.resize(kept);
+  return filter.predicatesDone();
 }
 
 // Of a predicate that answers the same for all nodes; false when a limit was reached.
@@ -378,6 +402,8 @@ template <class VisitOf>
 void XQueryPathWalk::streamMatching(size_t index, int axis, NSXMLNode* node, VisitOf visitOf) {
   const XQueryWalkedStep& step = _steps[index];
   const bool isLast = index + 1 == _steps.size();
+  // Without a trail the walk ends as soon as the answer is certain.
+  const bool isWalkedOnce = index == 0 && startsFromOne;
   size_t asked = 0;
   const auto handOn = [this, &step, isLast, index, &asked](NSXMLNode* found) {
     // A trail may go on after the end.
@@ -402,7 +428,7 @@ void XQueryPathWalk::streamMatching(size_t index, int axis, NSXMLNode* node, Vis
       takeNode(index + 1, found);
     }
     closeNodeList();
-  } else if (step.trail != XQueryWalkedStep::noTrail && !setsEveryFocus) {
+  } else if (step.trail != XQueryWalkedStep::noTrail && !setsEveryFocus && !isWalkedOnce) {
     trail(step.trail).walk(node, axis, visitOf(handOn));
   } else {
     XQueryWalkAnyAxis(node, axis, false, visitOf(handOn));
@@ -447,6 +473,10 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
     });
     return first + 1;
   }
+  const bool hasConditions =
+      step.positions.conditions.first == first && !listingStep && !step.testMayRaise &&
+      step.positions.fromBack.predicate != step.positions.conditions.position;
+  if (hasConditions) return collectKept(step, axis, node, nodes);
   const bool isComputed = step.isPositionComputed && step.positions.sameForAll == first;
   if (isComputed && !listingStep && !step.testMayRaise) {
     collectComputed(step, axis, node, nodes);
@@ -460,6 +490,17 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
     collectFromBack(step, node, nodes);
     return first + 1;
   }
+  walkFor(step, axis, node, [&nodes](NSXMLNode* found) {
+    nodes.push_back(found);
+    return true;
+  });
+  return first;
+}
+
+// Does something with each node that the test accepts, as long as that wants more of them.
+template <class Act>
+void XQueryPathWalk::walkFor(const XQueryWalkedStep& step, int axis, NSXMLNode* node, Act act) {
+  XQueryStepTest test(step, *this);
   const auto walk = [&](auto visit) {
     if (step.trail != XQueryWalkedStep::noTrail && !setsEveryFocus) {
       trail(step.trail).walk(node, axis, visit);
@@ -467,18 +508,27 @@ size_t XQueryPathWalk::collect(const XQueryWalkedStep& step, int axis, NSXMLNode
       XQueryWalkAnyAxis(node, axis, true, visit);
     }
   };
-  const auto add = [&nodes](NSXMLNode* found) {
-    nodes.push_back(found);
-    return true;
-  };
   if (const NSXMLExpandedName* name = test.onlyName()) {
-    walk(XQueryNamedVisit(name, axis, add));
+    walk(XQueryNamedVisit(name, axis, act));
   } else if (test.onlyNames()) {
-    walk(XQueryChoiceVisit(test, add));
+    walk(XQueryChoiceVisit(test, act));
   } else {
-    walk([&test, add](NSXMLNode* found) { return !test.matches(found) || add(found); });
+    walk([&test, act](NSXMLNode* found) { return !test.matches(found) || act(found); });
   }
-  return first;
+}
+
+// The same for conditions with a position behind them: the walk ends where no condition is asked
+// any more.
+size_t XQueryPathWalk::collectKept(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
+                                   std::vector<NSXMLNode*>& nodes) {
+  XQueryConditionFilter filter(*step.step, step.positions, context);
+  int64_t position = 0;
+  walkFor(step, axis, node, [&](NSXMLNode* found) {
+    if (filter.keeps(found, ++position)) nodes.push_back(found);
+    return !filter.isOver();
+  });
+  hasFailed = hasFailed || filter.hasFailed();
+  return filter.predicatesDone();
 }
 
 // The number is worked out when there is a node to ask it for: without any, it is not evaluated.

@@ -124,6 +124,10 @@ class XQueryPathWalk : public XQueryPathRun {
                        std::vector<NSXMLNode*>& nodes);
   bool collectRange(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
                     std::vector<NSXMLNode*>& nodes);
+  size_t collectKept(const XQueryWalkedStep& step, int axis, NSXMLNode* node,
+                     std::vector<NSXMLNode*>& nodes);
+  template <class Act>
+  void walkFor(const XQueryWalkedStep& step, int axis, NSXMLNode* node, Act act);
   void collectFromBack(const XQueryWalkedStep& step, const NSXMLNode* node,
                        std::vector<NSXMLNode*>& nodes);
   bool onlyCounts(size_t index, int axis, const NSXMLNode* node) const;
@@ -133,6 +137,7 @@ class XQueryPathWalk : public XQueryPathRun {
   bool filterNodes(const XQueryWalkedStep& step, size_t fromIndex, std::vector<NSXMLNode*>& nodes);
   bool keepAtOnce(const XQueryExpr& predicate, std::vector<NSXMLNode*>& nodes);
   bool keepRange(const XQueryPositionRange& range, std::vector<NSXMLNode*>& nodes);
+  size_t keepUpToPosition(const XQueryWalkedStep& step, std::vector<NSXMLNode*>& nodes);
   bool keepNodes(const XQueryExpr& predicate, const XQueryNodeQuestion& question,
                  std::vector<NSXMLNode*>& nodes);
 

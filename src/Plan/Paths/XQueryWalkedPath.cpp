@@ -6,6 +6,7 @@
 #include "Expr/XQueryListChanges.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Operators/XQueryNodeQuestion.h"
+#include "Plan/Paths/XQueryConditionFilter.h"
 #include "Plan/Paths/XQueryPathGivers.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/Arena.h"
@@ -80,6 +81,22 @@ Value keptItems(const Value& items, const XQueryExpr& predicate, const XQueryNod
     dynamic.setContextItem(list[list.count() - 1], static_cast<int64_t>(list.count()));
   }
   return kept.value();
+}
+
+// The items that conditions keep of those at the positions that are asked for behind them.
+Value itemsUpToPosition(const Value& items, XQueryConditionFilter& filter,
+                        const XQueryNodeQuestion* stretch, const XQueryContext& context) {
+  const XQueryItemList list(items.get());
+  XQueryGatherer kept;
+  WorkPacer pacer;
+  const Stretch asked =
+      stretch ? stretchBelow(stretch->nodeAbove(context), list) : Stretch{0, list.count()};
+  for (size_t i = asked.first; i < asked.end && !filter.isOver(); ++i) {
+    pacer.turn();
+    const size_t at = filter.goesBackwards() ? asked.end - 1 - (i - asked.first) : i;
+    if (filter.keeps(list[at], static_cast<int64_t>(at) + 1)) kept.add(list[at]);
+  }
+  return filter.hasFailed() ? Value() : kept.value();
 }
 
 // As a predicate keeps it that asks for that position.
@@ -203,6 +220,7 @@ void XQueryWalkedPath::takeSteps(XQueryWalkedPath& of) {
   _steps.insert(_steps.begin(), std::make_move_iterator(of._steps.begin()),
                 std::make_move_iterator(of._steps.end()));
   of._steps.clear();
+  of._areStepsTaken = true;
 }
 
 XQueryStepPositions* XQueryWalkedPath::positionsOf(const XQueryStep& step) {
@@ -231,7 +249,7 @@ bool XQueryWalkedPath::showsErrors(const XQueryContext& context) const {
 }
 
 Value XQueryWalkedPath::computeValue(XQueryContext& context) const {
-  if (showsErrors(context)) return plain().evaluateWithContext(context);
+  if (_areStepsTaken || showsErrors(context)) return plain().evaluateWithContext(context);
   XQueryCheckStack(context);
   XQueryPathResults results;
   Value items;
@@ -386,33 +404,43 @@ Value XQueryWalkedPath::evaluateStart(XQueryContext& context,
       _start->expr() ? _start->expr()->evaluateWithContext(context) : Value(NSNull::null());
   if (XQueryHasFailed(items, context)) return {};
   if (_picker && _pickedStep == _start && pickItems(items, context, number)) return items;
+  const auto& predicates = _start->predicates();
   size_t index = 0;
-  for (const auto& predicate : _start->predicates()) {
-    if (!items) break;  // there is no context item
-    if (index == _startPositions.fromBack.predicate) {
-      items = itemFromBack(items, _startPositions.fromBack.behind);
-      ++index;
-      continue;
-    }
-    if (index == _startPositions.sameForAll) {
-      items = itemsChosenAtOnce(items, *predicate, context);
-      if (!items) return {};
-      ++index;
-      continue;
-    }
-    if (index == _startPositions.range.predicate &&
-        keepRange(_startPositions.range, items, context)) {
-      ++index;
-      continue;
-    }
-    const auto* question =
-        _start->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(predicate.get());
-    if (!question) break;
-    items = keptItems(items, *predicate, *question, _isStartInOrder, context);
+  while (index < predicates.size() && items) {  // null where there is no context item
+    const size_t done = keepStart(index, items, context);
     if (XQueryHasFailed(items, context)) return {};
-    ++index;
+    if (done == 0) break;
+    index += done;
   }
   return _start->handlePreicatesFromIndex(index, std::move(items), context);
+}
+
+// Keeps items of the start as its predicates from one on do; answers how many of these are dealt
+// with, none where the step itself has to ask.
+size_t XQueryWalkedPath::keepStart(size_t index, Value& items, XQueryContext& context) const {
+  const XQueryExpr& predicate = *_start->predicates()[index];
+  const auto* question =
+      _start->asksForPosition(index) ? nullptr : XQueryNodeQuestionIn(&predicate);
+  if (index == _startPositions.conditions.first) {
+    XQueryConditionFilter filter(*_start, _startPositions, context);
+    items = itemsUpToPosition(items, filter, _isStartInOrder ? question : nullptr, context);
+    return filter.predicatesDone() - index;
+  }
+  if (index == _startPositions.fromBack.predicate) {
+    items = itemFromBack(items, _startPositions.fromBack.behind);
+    return 1;
+  }
+  if (index == _startPositions.sameForAll) {
+    items = itemsChosenAtOnce(items, predicate, context);
+    return 1;
+  }
+  if (index == _startPositions.range.predicate &&
+      keepRange(_startPositions.range, items, context)) {
+    return 1;
+  }
+  if (!question) return 0;
+  items = keptItems(items, predicate, *question, _isStartInOrder, context);
+  return 1;
 }
 
 // --- picking -------------------------------------------------------------------------------------

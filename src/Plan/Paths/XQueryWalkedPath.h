@@ -83,7 +83,8 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
     bool findsInOrder = false;
   };
   std::vector<XQueryWalkedStep>& changeableSteps() { return _steps; }
-  // Puts the steps of another path, which this one begins with, before its own.
+  // Puts the steps of another path, which this one begins with, before its own. The other one is
+  // evaluated as it is written from then on.
   void takeSteps(XQueryWalkedPath& of);
   // What is told about the predicates of the start, or of an axis step; null for other steps.
   XQueryStepPositions* positionsOf(const XQueryStep& step);
@@ -107,6 +108,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   Answer evaluate(XQueryContext& context, Value& items, XQueryPathResults& results) const;
   Answer walk(XQueryContext& context, Value& items, XQueryPathResults& results) const;
   Value evaluateStart(XQueryContext& context, std::optional<uint64_t>* number = nullptr) const;
+  size_t keepStart(size_t index, Value& items, XQueryContext& context) const;
   bool mayEndEarly(const Value& items, const XQueryPathWalk& walk) const;
   bool listStart(XQueryContext& context, std::vector<Value>& nodes) const;
   bool listNodes(const Value& start, const XQueryWalkedStep& step, XQueryPathWalk& walk,
@@ -121,6 +123,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   XQueryStepPositions _startPositions;
   bool _isStartInOrder = false;
   std::vector<XQueryWalkedStep> _steps;
+  bool _areStepsTaken = false;
   bool _hasPredicates = false;
   std::unique_ptr<const XQueryPicker> _picker;
   const XQueryStep* _pickedStep = nullptr;

@@ -22,6 +22,14 @@ struct XQueryFromBack {
   uint64_t behind = 0;  // the number of items behind the one that is asked for
 };
 
+// The predicates of a step that are conditions, in front of one that asks the items that these keep
+// for positions: behind the last position none of them is asked.
+struct XQueryConditionsBefore {
+  static constexpr size_t noPredicate = SIZE_MAX;
+  size_t first = noPredicate;  // of the conditions
+  size_t position = 0;         // what asks for positions, the one behind the last condition
+};
+
 // The predicates of a step that need not be asked of each item, by their numbers.
 struct XQueryStepPositions {
   static constexpr size_t noPredicate = SIZE_MAX;
@@ -30,6 +38,8 @@ struct XQueryStepPositions {
   XQueryPositionRange range;
   // Answers the same for all items: a position, or whether they are kept.
   size_t sameForAll = noPredicate;
+  // The position is asked for by a number, or by one of the three above.
+  XQueryConditionsBefore conditions;
 };
 
 struct XQueryWalkedStep {

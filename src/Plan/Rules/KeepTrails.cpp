@@ -50,6 +50,10 @@ bool arriveInOrder(const Steps& steps) {
         if (!wasOne) return false;
         found = Found::Apart;
         break;
+      case XQueryAxisFollowing:
+        if (!wasOne) return false;
+        found = Found::Nested;
+        break;
       case XQueryAxisDescendant:
       case XQueryAxisDescendantOrSelf:
         // "//" goes on in document order where it is joined with the next step, which is known of
