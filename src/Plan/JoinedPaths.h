@@ -5,10 +5,9 @@
 //   declare function f() { P }; ... f()[C]       f()/P'[C], where f answers the document of P
 //   for $a in P for $b in $a/Q ...               for $b in P/Q ...
 //
-// What holds      P begins at the document and goes down by names alone, so that it can fail
-// nowhere
-//                 but in looking for the document, which is done where it was: there the variable,
-//                 or the function, takes the document. All uses are such as a path goes on from, or
+// What holds      P begins at the document and goes down by names alone: it can fail nowhere but in
+//                 looking for the document, which is done where it was, so that the variable, or
+//                 the function, takes the document. All uses are such as a path goes on from, or
 //                 ask for no more than the number of its nodes; predicates ask for truth. The tree
 //                 is that in which the query begins, or that of the focus of a call
 // Why             the index of the tree knows the way from the document to what a path finds, its

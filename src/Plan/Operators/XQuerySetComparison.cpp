@@ -1,9 +1,9 @@
 // Nobody can tell: pairs are compared in an order of which nothing is left to see, unless one of
-// them is an error. A set takes text, or else numbers, and a probe that it can answer: then no pair
-// is: so a set of texts may also read its list as far as it takes to find one, and no further.
-// Nothing is compared with a list without items, but each of the other items has to be one that
-// can be compared, which those of a set are. Everything else is compared as it was written, and so
-// is everything with diagnostics on.
+// them is an error. A set takes texts alone, or numbers alone, and answers for such probes only,
+// so that no pair is one: a set of texts may even read its list no further than to the first text
+// that is equal. Nothing is compared with a list without items, but each of the other items has to
+// be one that can be compared, which those of a set are. Everything else is compared as it was
+// written, and so is everything with diagnostics on.
 #include "Plan/Operators/XQuerySetComparison.h"
 
 #include "Context/KeptValues.h"
