@@ -100,7 +100,9 @@ class UTF8Form {
     _units.clear();
     const auto* next = reinterpret_cast<const unsigned char*>(text.data());
     const auto* const end = next + text.size();
+    WorkPacer pacer;
     while (next < end) {
+      pacer.turn();
       appendUTF16(_units, readUTF8(next, end));
     }
     out.append({_units.data(), static_cast<uint32_t>(_units.size())});

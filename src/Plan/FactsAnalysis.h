@@ -3,7 +3,7 @@
 // What follows from the parts is said once for each class of expressions, in the table of
 // FactsAnalysis.cpp and the files of the families beside it:
 //
-//   FactsOfLeaves, FactsOfOperators, FactsOfPaths, FactsOfClauses, FactsOfCalls
+//   FactsOfLeaves, FactsOfRoots, FactsOfOperators, FactsOfPaths, FactsOfClauses, FactsOfCalls
 //
 // To add a class: a row in the table and a function in the file of its family.
 //

@@ -301,14 +301,15 @@ class RankedOrder {
 
 // Leaves the first `most` entries in their order. Of equal ones the earlier is the first.
 void keepFirst(std::vector<Entry>& entries, size_t most, RankedOrder& order) {
-  const auto isBefore = [&order](const Entry& a, const Entry& b) {
+  WorkPacer pacer;
+  const auto isBefore = [&](const Entry& a, const Entry& b) {
+    pacer.turn();
     if (order.isBefore(a, b)) return true;
     return !order.isBefore(b, a) && a.index < b.index;
   };
   std::vector<Entry> kept(entries.begin(), entries.begin() + static_cast<std::ptrdiff_t>(most));
   std::make_heap(kept.begin(), kept.end(), isBefore);
   for (size_t i = most; i < entries.size(); ++i) {
-    checkWork();
     if (!isBefore(entries[i], kept.front())) continue;
     std::pop_heap(kept.begin(), kept.end(), isBefore);
     kept.back() = entries[i];

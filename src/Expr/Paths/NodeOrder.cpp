@@ -20,6 +20,7 @@
 #include "xquery/Number.h"
 
 #include <algorithm>
+#include <array>
 #include <cstdint>
 
 namespace xquery {
@@ -94,19 +95,39 @@ struct Placed {
   bool isRoot() const { return node.get() == root; }
 };
 
+// The roots of the trees that nodes are of, which mostly are few that come again: climbing to the
+// root for each change of tree would multiply the depth of the trees into the sort.
+class RootsMet {
+ public:
+  const NSXMLNode* rootOf(const NSXMLNode* node) {
+    for (const Met& each : _met) {
+      if (each.node && NSXMLNodeOrder::areComparable(each.node, node)) return each.root;
+    }
+    Met& latest = _met[_next++ % _met.size()];
+    latest = {node, node->rootNode()};
+    return latest.root;
+  }
+
+ private:
+  struct Met {
+    const NSXMLNode* node = nullptr;
+    const NSXMLNode* root = nullptr;
+  };
+  std::array<Met, 8> _met{};
+  size_t _next = 0;
+};
+
 std::vector<Placed> placedNodes(std::vector<Value>& nodes) {
   std::vector<Placed> placed;
   placed.reserve(nodes.size());
-  const NSXMLNode* previous = nullptr;
+  RootsMet roots;
   WorkPacer pacer;
   for (Value& value : nodes) {
     pacer.turn();
     const NSXMLNode* node = nodeOf(value);
-    const bool inSameTree = previous && NSXMLNodeOrder::areComparable(previous, node);
-    const NSXMLNode* root = inSameTree ? placed.back().root : node->rootNode();
+    const NSXMLNode* root = roots.rootOf(node);
     (void)NSXMLNodeOrder::areComparable(node, node);  // makes the number good
     placed.push_back({std::move(value), root, NSXMLNodeOrder::number(*node), placed.size()});
-    previous = node;
   }
   return placed;
 }

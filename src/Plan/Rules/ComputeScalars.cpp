@@ -1,8 +1,7 @@
 // Arithmetic, comparisons and logic over single numbers.
 //
 // Pattern     an operator of arithmetic, a value or general comparison, "and", "or", not() and
-// calls
-//             of functions of numbers over others of these, local variables, ".", position(),
+//             calls of functions of numbers over others of these, local variables, ".", position(),
 //             last() and numbers; arithmetic of one operator alone gains nothing
 // Facts       of a variable and of ".": it may be a number, or untyped in arithmetic; compared, it
 //             or what it is compared with is surely one; and no other rule has put something in the

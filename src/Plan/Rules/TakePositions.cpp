@@ -1,8 +1,7 @@
 // Positions that a step could have been asked for by number.
 //
-// Pattern     a[position() = 3], a[3 eq position()]; a[$i + 1], $l[$i]; a[last()], (//a)[last() -
-// 1],
-//             $l[position() = last()]
+// Pattern     a[position() = 3], a[3 eq position()]; a[$i + 1], $l[$i]; a[last()],
+//             (//a)[last() - 1], $l[position() = last()]
 // Facts       the number is an integer, 1 or more, or an expression that may answer numbers, reads
 //             no focus and is repeatable; nothing shows the focus that the predicate leaves
 //             (StepsAround.h), but for what is asked of the items that a path starts from, which

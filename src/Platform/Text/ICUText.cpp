@@ -13,6 +13,8 @@
 #include <array>
 #include <limits>
 #include <new>
+#include <numeric>
+#include <vector>
 
 namespace xquery {
 
@@ -80,12 +82,36 @@ bool hasLongRunOfMarks(std::u16string_view text) {
   return false;
 }
 
+struct Mark {
+  UChar32 point;
+  uint8_t combiningClass;
+};
+
+// By their classes, of which there are few; those of one class stay as they are.
+void orderMarks(std::vector<Mark>& marks) {
+  if (marks.size() <= longRun) {
+    std::stable_sort(marks.begin(), marks.end(), [](const Mark& a, const Mark& b) {
+      return a.combiningClass < b.combiningClass;
+    });
+    return;
+  }
+  WorkPacer pacer;
+  std::array<size_t, UINT8_MAX + 2> places{};  // where the next mark of a class goes
+  for (const Mark& mark : marks) {
+    pacer.turn();
+    ++places[mark.combiningClass + size_t{1}];
+  }
+  std::partial_sum(places.begin(), places.end(), places.begin());
+  std::vector<Mark> ordered(marks.size());
+  for (const Mark& mark : marks) {
+    pacer.turn();
+    ordered[places[mark.combiningClass]++] = mark;
+  }
+  marks.swap(ordered);
+}
+
 // The text decomposed, each run of marks in canonical order; an equivalent text.
 std::u16string orderedDecomposition(std::u16string_view text, const UNormalizer2* decomposer) {
-  struct Mark {
-    UChar32 point;
-    uint8_t combiningClass;
-  };
   std::u16string result;
   std::vector<Mark> marks;
   const auto append = [&](UChar32 point) {
@@ -95,9 +121,7 @@ std::u16string orderedDecomposition(std::u16string_view text, const UNormalizer2
     result.append(units, count);
   };
   const auto flush = [&] {
-    std::stable_sort(marks.begin(), marks.end(), [](const Mark& a, const Mark& b) {
-      return a.combiningClass < b.combiningClass;
-    });
+    orderMarks(marks);
     for (const Mark& mark : marks) append(mark.point);
     marks.clear();
   };
@@ -164,9 +188,11 @@ constexpr size_t unitsPerStep = 512;  // of converting
 template <class MayCut, class Convert>
 std::u16string inPieces(std::u16string_view text, MayCut mayCut, Convert convert) {
   std::u16string result;
+  WorkPacer pacer;
   while (text.size() > pieceLength) {
     size_t length = pieceLength;
     for (; length < text.size(); ++length) {
+      pacer.turn();
       const Neighbours at = neighboursAt(text, length);
       const bool insidePair = U16_IS_LEAD(at.before) && U16_IS_TRAIL(at.after);
       if (!insidePair && mayCut(at)) break;

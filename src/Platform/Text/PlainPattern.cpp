@@ -1,6 +1,9 @@
 #include "Platform/Text/PlainPattern.h"
 
+#include "Platform/Base/WorkMeter.h"
+
 #include <algorithm>
+#include <cstring>
 
 namespace xquery {
 namespace {
@@ -124,9 +127,29 @@ void PlainPattern::invert() {
   for (bool& isIn : _set) isIn = !isIn;
 }
 
+namespace {
+
+// The search of the system takes time in proportion to the text, whatever is searched for, and goes
+// on piece by piece, so that it can be left.
+size_t placeOf(std::string_view wanted, std::string_view subject, size_t from) {
+  constexpr size_t bytesPerStep = 512;
+  const size_t piece = std::max<size_t>(size_t{1} << 16, 4 * wanted.size());
+  while (subject.size() - from >= wanted.size()) {
+    const std::string_view left = subject.substr(from, piece + wanted.size() - 1);
+    const void* found = ::memmem(left.data(), left.size(), wanted.data(), wanted.size());
+    if (found) return static_cast<size_t>(static_cast<const char*>(found) - subject.data());
+    checkWork(1 + left.size() / bytesPerStep);
+    if (subject.size() - from <= piece) break;
+    from += piece;
+  }
+  return std::string_view::npos;
+}
+
+}  // namespace
+
 std::optional<PlainPattern::Match> PlainPattern::find(std::string_view subject, size_t from) const {
   if (!_text.empty()) {
-    const size_t at = subject.find(_text, from);
+    const size_t at = placeOf(_text, subject, from);
     if (at == std::string_view::npos) return std::nullopt;
     return Match{at, at + _text.size()};
   }

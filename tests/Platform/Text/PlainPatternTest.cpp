@@ -33,6 +33,36 @@ TEST(PlainPattern, IsATextOrASet) {
   }
 }
 
+// A long text is searched piece by piece, also for texts that are longer than a piece.
+TEST(PlainPattern, FindsTextsAnywhereInLongOnes) {
+  std::string subject(300'000, 'a');
+  for (const size_t length :
+       {size_t{1}, size_t{2}, size_t{1000}, size_t{70'000}, size_t{140'000}}) {
+    for (const size_t at :
+         {size_t{0}, size_t{65'530}, size_t{65'536}, size_t{131'071}, subject.size() - length}) {
+      if (at + length > subject.size()) continue;
+      const std::string wanted = std::string(length - 1, 'a') + "b";
+      subject[at + length - 1] = 'b';
+      const auto pattern = PlainPattern::of(wanted);
+      ASSERT_TRUE(pattern);
+      const auto found = pattern->find(subject, at / 2);
+      ASSERT_TRUE(found) << length << " " << at;
+      EXPECT_EQ(found->start, at);
+      EXPECT_EQ(found->end, at + length);
+      EXPECT_FALSE(pattern->find(subject, at + 1)) << length << " " << at;
+      subject[at + length - 1] = 'a';
+    }
+  }
+}
+
+// What nearly stands everywhere, for which trying each place takes minutes.
+TEST(PlainPattern, IsFoundInProportionToTheText) {
+  const std::string subject(8'000'000, 'a');
+  const auto pattern = PlainPattern::of(std::string(40'000, 'a') + "b");
+  ASSERT_TRUE(pattern);
+  EXPECT_FALSE(pattern->find(subject, 0));
+}
+
 std::vector<std::pair<size_t, size_t>> matchesOf(const std::string& pattern,
                                                  std::string_view subject) {
   const auto code = PCREPattern::compile(pattern, PCREUTF8 | PCRENoUTF8Check);
