@@ -3,6 +3,8 @@
 //   - what the expression reads is compared by identity: local variables, the context item or the
 //     document above it, the ordering mode; where a tree or a global variable has changed, or nodes
 //     are still being filled, nothing kept is used (Context/KeptValues.h)
+//     of an item that is read by way of its parents alone it is one of these, and what is below it
+//     is what is around the item
 //   - what it leaves behind it leaves each time: the variables that it sets, and after a failure
 //     the focus in which that arose, which the next evaluation of the context may start from
 //   - a failure is the same error again, raised where the expression stands
@@ -16,6 +18,7 @@
 #include "xquery/Number.h"
 #include "xquery/XMLNode.h"
 
+#include <algorithm>
 #include <array>
 #include <memory>
 #include <span>
@@ -27,22 +30,34 @@ namespace xquery {
 class XQueryKeptExpr::Dependencies {
  public:
   // `isKnown` is false where there is no telling: the document above what is no node.
-  Dependencies(const XQueryFacts& facts, const XQueryContextInternal& context) {
+  Dependencies(const XQueryFacts& facts, const std::vector<Above>& above,
+               const XQueryContextInternal& context) {
     add(NSNumber::numberWithBool(context.ordered()));
     if (facts.does(XQueryDeeds::ReadsItem)) {
-      add(context.contextItem());
+      add(read(context.contextItem(), 0, above));
     } else if (facts.does(XQueryDeeds::ReadsRoot)) {
       const auto* node = dyn_cast<NSXMLNode>(context.contextItem());
       isKnown = node != nullptr;
       if (node) add(node->rootNode());
     }
-    facts.reads.forEach([&](int64_t varID) { add(context.variableForID(varID)); });
+    facts.reads.forEach(
+        [&](int64_t varID) { add(read(context.variableForID(varID), varID, above)); });
   }
   std::span<const Value> values() const { return {_values.data(), _count}; }
 
   bool isKnown = true;
 
  private:
+  // What is read of an item: itself, or a node above it.
+  Value read(Value item, int64_t varID, const std::vector<Above>& above) {
+    const auto found = std::find_if(above.begin(), above.end(),
+                                    [varID](const Above& each) { return each.varID == varID; });
+    if (found == above.end()) return item;
+    auto* node = dyn_cast<NSXMLNode>(item.get());
+    for (uint8_t i = 0; i < found->steps && node; ++i) node = node->parent();
+    isKnown = isKnown && node;
+    return Value(node);
+  }
   void add(Value value) { _values[_count++] = std::move(value); }
 
   std::array<Value, mostVariables + 2> _values;
@@ -166,7 +181,12 @@ std::string_view XQueryKeptExpr::obstacleTo(const XQueryFacts& facts) {
 }
 
 Ref<XQueryKeptExpr> XQueryKeptExpr::exprWithPlain(Ref<XQueryExpr> plain, const XQueryFacts& facts) {
-  return make<XQueryKeptExpr>(std::move(plain), facts);
+  return exprWithPlain(std::move(plain), facts, {});
+}
+
+Ref<XQueryKeptExpr> XQueryKeptExpr::exprWithPlain(Ref<XQueryExpr> plain, const XQueryFacts& facts,
+                                                  std::vector<Above> above) {
+  return make<XQueryKeptExpr>(std::move(plain), facts, std::move(above));
 }
 
 Value XQueryKeptExpr::computeValue(XQueryContext& context) const {
@@ -175,11 +195,13 @@ Value XQueryKeptExpr::computeValue(XQueryContext& context) const {
   if (keptValues.looksAway(*this) || _internal(context).showsErrors()) {
     return plain().evaluateWithContext(context);
   }
-  const Dependencies dependencies(_facts, dynamic);
+  const Dependencies dependencies(_facts, _above, dynamic);
   if (!dependencies.isKnown) return plain().evaluateWithContext(context);
+  const bool looksAround = _facts.does(XQueryDeeds::ReadsOutside);
   std::shared_ptr<XQueryKeptValue> kept;
-  const auto use = keptValues.useAtOnce(*this, dependencies.values(),
-                                        _facts.does(XQueryDeeds::ReadsOutside), kept);
+  const auto use = _above.empty()
+                       ? keptValues.useAtOnce(*this, dependencies.values(), looksAround, kept)
+                       : keptValues.use(*this, dependencies.values(), looksAround, kept);
   if (use == XQueryKeptValues::Use::Further && kept) {
     return std::static_pointer_cast<Outcome>(kept)->replay(dynamic);
   }
@@ -187,7 +209,9 @@ Value XQueryKeptExpr::computeValue(XQueryContext& context) const {
   Assignments assignments(_facts, dynamic);
   const Focus before(dynamic);
   Value value = plain().evaluateWithContext(context);
-  const bool isKnown = assignments.finish() && !dynamic.isFailingForGood();
+  bool isKnown = assignments.finish() && !dynamic.isFailingForGood();
+  // The focus that an error leaves may be the item itself.
+  if (!_above.empty() && (!value || dynamic.isFailing())) isKnown = false;
   std::shared_ptr<Outcome> outcome;
   if (isKnown) outcome = std::make_shared<Outcome>(value, std::move(assignments), before, dynamic);
   keptValues.keep(*this, dependencies.values(), std::move(outcome));

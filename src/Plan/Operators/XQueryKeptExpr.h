@@ -6,7 +6,10 @@
 #include "Plan/Operators/XQueryPlannedExpr.h"
 
 #include <cstddef>
+#include <cstdint>
 #include <string_view>
+#include <utility>
+#include <vector>
 
 namespace xquery {
 
@@ -21,12 +24,23 @@ class XQueryKeptExpr : public XQueryPlannedExpr {
   [[nodiscard]] static Ref<XQueryKeptExpr> exprWithPlain(Ref<XQueryExpr> plain,
                                                          const XQueryFacts& facts);
 
+  // Of an item that the expression reads nothing of but what lies so many parents above it, the
+  // parent there is what is compared: "../sale/price" is the same for all children of a node. Such
+  // an outcome is kept when it comes a second time, and a failure is not.
+  struct Above {
+    int64_t varID;  // 0 for the context item
+    uint8_t steps;
+  };
+  [[nodiscard]] static Ref<XQueryKeptExpr> exprWithPlain(Ref<XQueryExpr> plain,
+                                                         const XQueryFacts& facts,
+                                                         std::vector<Above> above);
+
   // The value of the expression, or its failure, which is raised anew.
   Value computeValue(XQueryContext& context) const override;
 
  protected:
-  XQueryKeptExpr(Ref<XQueryExpr> plain, const XQueryFacts& facts)
-      : XQueryPlannedExpr(std::move(plain)), _facts(facts) {}
+  XQueryKeptExpr(Ref<XQueryExpr> plain, const XQueryFacts& facts, std::vector<Above> above)
+      : XQueryPlannedExpr(std::move(plain)), _facts(facts), _above(std::move(above)) {}
   template <class T, class... Arguments>
   friend Ref<T> make(Arguments&&...);
 
@@ -37,6 +51,7 @@ class XQueryKeptExpr : public XQueryPlannedExpr {
   class Outcome;
 
   const XQueryFacts _facts;
+  const std::vector<Above> _above;
 };
 
 }  // namespace xquery

@@ -5,6 +5,8 @@
 //             time to the next, and takes more work than looking that up: it holds a path of some
 //             length, a FLWOR, a quantifier, a call of a declared function or of a built-in one
 //             that goes through all items of a list
+//             The same for what reads nothing of the item that differs but what lies above it, and
+//             so is the same for its siblings: "@sku = ../line/sku"
 // Facts       it is repeatable; all that it reads is known one by one; its items are nodes, or
 //             which objects they are cannot be told
 // Operator    XQueryKeptExpr: evaluates it when it is first needed, and keeps the outcome
@@ -23,12 +25,16 @@
 #include "Functions/String.h"
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Operators/XQueryKeptExpr.h"
+#include "Plan/Operators/XQueryShortWalk.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 #include "Plan/Rules/PlaceInside.h"
+#include "Plan/Rules/ReadsAbove.h"
 #include "Prolog/XQueryDeclarations.h"
 
 #include <algorithm>
+#include <cstddef>
+#include <cstdint>
 #include <iterator>
 #include <set>
 #include <string_view>
@@ -51,11 +57,10 @@ bool isAtHand(const XQueryExpr* expr) {
 
 // A path from a variable or the context item over a few children or attributes is done as quickly
 // as looked up, where it begins with one node.
-bool isShort(const XQueryPathExpr& path) {
-  constexpr int fewSteps = 3;
-  int steps = 0;
+bool isNarrow(const XQueryPathExpr& path, size_t mostSteps) {
+  size_t steps = 0;
   for (const XQueryStep* step = path.step(); step; step = step->next()) {
-    if (!step->predicates().empty() || ++steps > fewSteps) return false;
+    if (!step->predicates().empty() || ++steps > mostSteps) return false;
     const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
     if (!axisStep) {
       if (step != path.step() || !isAtHand(step->expr())) return false;
@@ -70,6 +75,11 @@ bool isShort(const XQueryPathExpr& path) {
   return true;
 }
 
+bool isShort(const XQueryPathExpr& path) {
+  constexpr size_t fewSteps = 3;
+  return isNarrow(path, fewSteps);
+}
+
 // Whether a call takes the longer the more items its arguments have.
 bool goesThroughItems(const XQueryFunctionCall& call) {
   constexpr XQueryProcedure functions[] = {fn_sum,         fn_avg,      fn_max,
@@ -82,23 +92,34 @@ bool goesThroughItems(const XQueryFunctionCall& call) {
 class Search {
  public:
   explicit Search(XQueryPlanning& planning)
-      : _planning(planning),
-        _program(planning.program),
-        _isLaborious(planning.program.placeCount()) {}
+      : _planning(planning), _program(planning.program), _work(planning.program.placeCount()) {}
 
   void run() {
     noteLists();
     for (const XQueryPlaceID place : _program.partsFirst()) {
-      _isLaborious[place] = _isLaborious[place] || isLaborious(place) || isWalked(place);
+      if (isLaborious(place) || isWalked(place)) {
+        _work[place] = std::max(_work[place], isFewSteps(place) ? Work::Some : Work::Much);
+      }
       const XQueryPlaceID whole = at(place).parent;
-      if (whole != XQueryNoPlace && _isLaborious[place]) _isLaborious[whole] = true;
+      if (whole != XQueryNoPlace) _work[whole] = std::max(_work[whole], _work[place]);
     }
     for (XQueryPlaceID place = 0; place < _program.placeCount(); ++place) {
-      if (_isLaborious[place] && isOpen(place) && isInvariantSomewhere(place)) keep(place);
+      if (_work[place] == Work::None || !isOpen(place)) continue;
+      if (isInvariantSomewhere(place, facts(place))) {
+        keep(place, {});
+      } else if (_work[place] == Work::Some) {
+        continue;
+      } else if (auto above = readAbove(place); !above.empty()) {
+        keep(place, std::move(above));
+      }
     }
   }
 
  private:
+  // How much looking up would save: something where all that it takes is the same each time, or
+  // also where it is the same for some items only.
+  enum class Work : uint8_t { None, Some, Much };
+
   const XQueryPlace& at(XQueryPlaceID place) const { return _program[place]; }
   const XQueryFacts& facts(XQueryPlaceID place) const { return _planning.facts[place]; }
 
@@ -106,7 +127,8 @@ class Search {
     const XQueryExpr& expr = *at(place).expr;
     switch (expr.kind()) {
       case Kind::PathExpr:
-        return !isShort(*cast<XQueryPathExpr>(&expr)) || beginsWithList(place);
+        return !isShort(*cast<XQueryPathExpr>(&expr)) || beginsWithList(place) ||
+               isComparedFromAbove(place);
       case Kind::FLWORExpr:
       case Kind::QuantifiedExpr:
         return true;
@@ -117,6 +139,35 @@ class Search {
       default:
         return false;
     }
+  }
+
+  // Whether a path does no more than go up and down by a few steps, and is not one whose items are
+  // compared.
+  bool isFewSteps(XQueryPlaceID place) const {
+    const auto* path = dyn_cast<XQueryPathExpr>(at(place).expr);
+    return path && isNarrow(*path, XQueryShortWalk::mostSteps) && !isComparedFromAbove(place);
+  }
+
+  // Whether a path goes up to go down again, by steps enough to find many, for a comparison.
+  bool isComparedFromAbove(XQueryPlaceID place) const {
+    const auto& path = *cast<XQueryPathExpr>(at(place).expr);
+    int down = 0;
+    int up = 0;
+    for (const XQueryStep* step = path.step(); step; step = step->next()) {
+      const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
+      if (axisStep && axisStep->axis() == XQueryAxisParent) ++up;
+      if (axisStep && axisStep->axis() == XQueryAxisChild) ++down;
+    }
+    return up > 0 && down > 1 && isComparedInGeneral(place);
+  }
+
+  bool isComparedInGeneral(XQueryPlaceID place) const {
+    const XQueryPlaceID whole = at(XQueryPlaceAround(_program, place)).parent;
+    const auto* comparison =
+        whole == XQueryNoPlace ? nullptr : dyn_cast<XQueryOperatorExpr>(at(whole).expr);
+    constexpr int generalClass = 6;
+    return comparison &&
+           XQueryOperatorExpr::operatorClassification(comparison->operatorType()) == generalClass;
   }
 
   // Whether a path goes on from a variable that has been given a list.
@@ -135,13 +186,7 @@ class Search {
   // for: the calls of a loop mostly pass the same one.
   bool isComparedList(XQueryPlaceID path, const XQueryVariable& parameter) const {
     const XQueryFunctionDecl* function = _program.bodyOf(path).function;
-    if (!function || _lists.count({function, parameter.varID()}) == 0) return false;
-    const XQueryPlaceID whole = at(XQueryPlaceAround(_program, path)).parent;
-    if (whole == XQueryNoPlace) return false;
-    const auto* comparison = dyn_cast<XQueryOperatorExpr>(at(whole).expr);
-    constexpr int generalClass = 6;
-    return comparison &&
-           XQueryOperatorExpr::operatorClassification(comparison->operatorType()) == generalClass;
+    return function && _lists.count({function, parameter.varID()}) > 0 && isComparedInGeneral(path);
   }
 
   // Notes the parameters for which some call passes many items.
@@ -191,21 +236,44 @@ class Search {
     return !range || range->operatorType() != XQueryOperatorTo;
   }
 
-  void keep(XQueryPlaceID place) {
+  using Above = XQueryKeptExpr::Above;
+
+  // What it reads by way of parents, where it is invariant but for that; none for others.
+  std::vector<Above> readAbove(XQueryPlaceID place) const {
+    XQueryFacts own = facts(place);
+    std::vector<Above> above;
+    const auto add = [&](int64_t varID) {
+      const uint8_t steps = XQueryStepsToWhatIsRead(_planning, place, varID);
+      if (steps > 0) above.push_back({varID, steps});
+      return steps > 0;
+    };
+    // A tree without a document may be changed by what is constructed: nothing is kept of it.
+    if (!own.does(XQueryDeeds::ReadsOutside) || !own.reads.isExact()) return {};
+    if (own.does(XQueryDeeds::ReadsItem) && add(0)) own.deeds &= ~unsigned{XQueryDeeds::ReadsItem};
+    const XQueryVariableSet reads = own.reads;
+    reads.forEach([&](int64_t varID) {
+      if (add(varID)) own.reads.remove(varID);
+    });
+    const bool isInvariant = !above.empty() && isInvariantSomewhere(place, own);
+    return isInvariant ? above : std::vector<Above>();
+  }
+
+  void keep(XQueryPlaceID place, std::vector<Above> above) {
     const XQueryFacts& own = facts(place);
     std::string_view obstacle = XQueryKeptExpr::obstacleTo(own);
     if (obstacle.empty() && !own.are(XQueryItems::Node) && _planning.showsIdentity(place)) {
       obstacle = "it may answer values that are no nodes, and which objects they are can be told";
     }
     if (!obstacle.empty()) return _planning.refuse(place, obstacle);
-    _planning.wrap(place, XQueryKeptExpr::exprWithPlain(*at(place).slot, own),
-                   "evaluated when it is first needed, and kept as long as nothing that it reads "
-                   "has changed");
+    const bool isOfAll = above.empty();
+    _planning.wrap(place, XQueryKeptExpr::exprWithPlain(*at(place).slot, own, std::move(above)),
+                   isOfAll ? "evaluated when it is first needed, and kept as long as nothing that "
+                             "it reads has changed"
+                           : "evaluated for one item, and kept for others below the same node");
   }
 
   // Whether some loop around it leaves all that it reads as it is.
-  bool isInvariantSomewhere(XQueryPlaceID place) const {
-    const XQueryFacts& own = facts(place);
+  bool isInvariantSomewhere(XQueryPlaceID place, const XQueryFacts& own) const {
     XQueryPlaceID inner = place;
     for (int level = 0; level < XQueryPlanning::mostLevels; ++level, inner = at(inner).parent) {
       if (inner != place && _planning.isWrapped(inner)) return false;
@@ -256,7 +324,7 @@ class Search {
 
   XQueryPlanning& _planning;
   const XQueryProgram& _program;
-  std::vector<bool> _isLaborious;
+  std::vector<Work> _work;
   std::set<std::pair<const XQueryFunctionDecl*, int64_t>> _lists;  // parameters, by their IDs
 };
 
