@@ -1,6 +1,7 @@
 #include "Plan/Joins/XQueryTermsBehind.h"
 
 #include "Expr/Clauses/XQueryFLWOR.h"
+#include "Expr/Clauses/XQueryQuantified.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Plan/Joins/XQueryKeyOfItem.h"
 #include "Plan/Rules/PlaceInside.h"
@@ -9,6 +10,13 @@
 
 namespace xquery {
 namespace {
+
+// Whether it is a clause of "some".
+bool isOfSome(const XQueryProgram& program, XQueryPlaceID clause) {
+  if (program[clause].expr->kind() != Kind::QuantifiedItem) return false;
+  const auto* quantifier = dyn_cast<XQueryQuantifiedExpr>(program[program[clause].parent].expr);
+  return quantifier && !quantifier->every();
+}
 
 // The clause that walks the items, alone and as they are found; XQueryNoPlace for none.
 XQueryPlaceID clauseAround(const XQueryPlanning& planning, XQueryPlaceID path) {
@@ -19,9 +27,11 @@ XQueryPlaceID clauseAround(const XQueryPlanning& planning, XQueryPlaceID path) {
     if (planning.isWrapped(place)) return XQueryNoPlace;
   }
   const XQueryPlaceID clause = program[bound].parent;
+  const auto* binding = dyn_cast<XQueryBindingExpr>(program[clause].expr);
   const auto* forExpr = dyn_cast<XQueryForExpr>(program[clause].expr);
-  const bool isOpen = forExpr && !forExpr->type() && forExpr->posVarID() == 0 &&
-                      forExpr->varID() > 0 && forExpr->varID() < XQueryVariableSet::most;
+  const bool walks = forExpr ? forExpr->posVarID() == 0 : isOfSome(program, clause);
+  const bool isOpen = binding && walks && !binding->type() && binding->varID() > 0 &&
+                      binding->varID() < XQueryVariableSet::most;
   return isOpen ? clause : XQueryNoPlace;
 }
 
@@ -46,8 +56,10 @@ void XQueryAddTermsBehind(const XQueryPlanning& planning, XQueryPlaceID path,
   const XQueryProgram& program = planning.program;
   const XQueryPlaceID clause = clauseAround(planning, path);
   const XQueryPlaceID where = clause == XQueryNoPlace ? clause : program.nextPart(clause);
-  if (where == XQueryNoPlace || program[where].role != XQueryRole::Where) return;
-  const int64_t varID = cast<XQueryForExpr>(program[clause].expr)->varID();
+  if (where == XQueryNoPlace) return;
+  const XQueryRole role = program[where].role;
+  if (role != XQueryRole::Where && role != XQueryRole::Satisfies) return;
+  const int64_t varID = cast<XQueryBindingExpr>(program[clause].expr)->varID();
   XQueryJoinScope scope;
   scope.item.add(varID);
   scope.settled.add(varID);

@@ -43,6 +43,7 @@ Value XQueryPathCount::computeValue(XQueryContext& context) const {
   const uint64_t least = _question.least;
   NSXMLNode* start = _isShort ? _shortWalk.start(context) : nullptr;
   if (start && least > 0) return NSNumber::numberWithBool(holdsFrom(start));
+  if (start && _path->looksUpSiblings(start, context)) start = nullptr;
   const uint64_t most = least == 0 ? UINT64_MAX : least;
   const auto count =
       start ? std::optional(countFrom(start, most))

@@ -389,7 +389,9 @@ XQueryWalkedPath::Answer XQueryWalkedPath::walk(XQueryContext& context, Value& i
   walk.orderIsFree = dynamic.ordered();
   if (results.mayEndEarly() && !mayEndEarly(items, walk)) results.takeAll();
   const bool isPicked = _picker && !looksUpAll(items, walk);
-  const bool isTaken = isPicked ? pickNodes(items, walk) : walk.takeAlongWays(items);
+  const bool isTaken = isPicked         ? pickNodes(items, walk)
+                       : _keepsSiblings ? takeSiblings(items, walk)
+                                        : walk.takeAlongWays(items);
   if (!isTaken) {
     walk.takeValue(0, items, true);
     walk.noteMet();
@@ -532,15 +534,24 @@ bool XQueryWalkedPath::looksUpAll(const Value& start, const XQueryPathWalk& walk
 bool XQueryWalkedPath::pickNodes(const Value& start, XQueryPathWalk& walk) const {
   const XQueryWalkedStep* step = walked(*_pickedStep);
   if (!step || walk.setsEveryFocus) return false;
+  // Of several nodes all that they find together is picked from, and of one what all of its
+  // siblings find.
+  const bool isAmongSiblings =
+      step == &_steps.front() && beginsWithSiblings() && walk.startsFromOne;
+  const NSXMLNode* among = isAmongSiblings ? nodeAmongMany(start, walk.context) : nullptr;
+  if (isAmongSiblings && !among) return false;
   const auto list = [&](std::vector<Value>& listed) {
-    return listNodes(start, *step, walk, listed);
+    if (!among) return listNodes(start, *step, walk, listed);
+    listSiblings(among->parent(), walk, listed);
+    return true;
   };
   XQueryPicks picks;
-  const bool isCounted = walk.results.countsOnly() && step == &_steps.back();
+  const bool isCounted = walk.results.countsOnly() && step == &_steps.back() && !among;
   if (isCounted) picks.wantedNumber = XQueryPicks::Number::OfNodes;
-  const bool hasPicked = _picker->pick(start, list, walk.context, picks);
+  const bool hasPicked =
+      _picker->pick(among ? Value(among->parent()) : start, list, walk.context, picks);
   if (walk.hasFailed) return true;
-  if (!hasPicked) return false;
+  if (!hasPicked || (among && !leaveOnOneSide(among, picks))) return false;
   if (picks.number) {
     walk.results.addNumber(*picks.number);
     return true;
@@ -558,6 +569,7 @@ bool XQueryWalkedPath::pickNodes(const Value& start, XQueryPathWalk& walk) const
   }
   walk.takeNodes(static_cast<size_t>(step - _steps.data()) + 1, nodes);
   walk.closeNodeList();
+  if (step == &_steps.back()) walk.results.setIsReversed(step->isReverse());
   return true;
 }
 

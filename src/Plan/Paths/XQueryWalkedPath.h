@@ -71,6 +71,17 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
     _picker = std::move(picker);
     _pickedStep = ofStep;
   }
+  // Whether the step behind the start, or the first one, leads to siblings: of that the nodes are
+  // picked, or kept, for all children of a parent together.
+  bool beginsWithSiblings() const;
+  // To be kept are those of which the predicates are asked once, which read nothing but the node.
+  void keepSiblings() { _keepsSiblings = true; }
+  // The node that such a path starts from, where it is worth looking up what that finds from there,
+  // and it may be done; else null.
+  NSXMLNode* nodeAmongMany(const Value& start, const XQueryContext& context) const;
+  bool looksUpSiblings(NSXMLNode* start, const XQueryContext& context) const {
+    return _keepsSiblings && nodeAmongMany(Value(start), context);
+  }
   // Lists the nodes that the predicates of the start, or of such an axis step, are asked for; false
   // when that fails, and for items that are no nodes.
   bool listNodesBefore(const XQueryStep& step, XQueryContext& context,
@@ -115,6 +126,12 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
                  std::vector<Value>& listed) const;
   bool pickItems(Value& items, XQueryContext& context, std::optional<uint64_t>* number) const;
   bool pickNodes(const Value& start, XQueryPathWalk& walk) const;
+  class Siblings;
+  void listSiblings(const NSXMLNode* parent, XQueryPathWalk& walk,
+                    std::vector<Value>& listed) const;
+  bool leaveOnOneSide(const NSXMLNode* node, XQueryPicks& picks) const;
+  std::shared_ptr<const Siblings> siblingsBelow(NSXMLNode* parent, XQueryPathWalk& walk) const;
+  bool takeSiblings(const Value& start, XQueryPathWalk& walk) const;
   bool looksUpAll(const Value& start, const XQueryPathWalk& walk) const;
   bool showsErrors(const XQueryContext& context) const;
 
@@ -127,6 +144,7 @@ class XQueryWalkedPath : public XQueryPlannedExpr {
   bool _hasPredicates = false;
   std::unique_ptr<const XQueryPicker> _picker;
   const XQueryStep* _pickedStep = nullptr;
+  bool _keepsSiblings = false;
   size_t _trailCount = 0;
   bool _countsNodes = false;
   bool _findsInOrder = false;

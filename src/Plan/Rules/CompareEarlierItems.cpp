@@ -1,19 +1,24 @@
 // What has come up before.
 //
 // Pattern     L = V[position() < E] and L = V[position() <= E], on either side, also with a few
-//             steps to children and attributes behind the predicate, where V is a variable
+//             steps to children and attributes behind the predicate, where V is a variable; the
+//             same with N/preceding-sibling::a, N/following-sibling::a, N/preceding::a and
+//             N/following::a, where N is the context item or a variable
 // Facts       L and E are repeatable; E cannot fail and does not read the focus; L cannot fail
 //             unless it is on the left, where it is evaluated first
 // Refused     where one of these is missing; for items that are not those of a variable; for steps
 //             of another kind
-// Operator    XQueryEarlierItems: finds the first item that is equal in a table of all of them
+// Operator    XQueryEarlierItems: finds the first item that is equal in a table of all of them;
+//             XQueryNodesAside: the same with the first or the last of the nodes beside each other
 // Why         see there
 #include "Expr/Operators/XQueryOperatorExpr.h"
 #include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLeaves.h"
 #include "Plan/Operators/XQueryEarlierItems.h"
+#include "Plan/Operators/XQueryNodesAside.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/PathAt.h"
 #include "Plan/Rules/PlaceInside.h"
 #include "Plan/Rules/PositionConditions.h"
 
@@ -55,10 +60,40 @@ class Search {
 
  private:
   void lookAt(XQueryPlaceID place, XQueryPlaceID left, XQueryPlaceID right) {
+    if (takeNodes(place, left, right, true) || takeNodes(place, right, left, false)) return;
     std::string_view obstacle;
     if (takeOver(place, left, right, true, obstacle)) return;
     if (takeOver(place, right, left, false, obstacle)) return;
     if (!obstacle.empty()) _planning.refuse(place, obstacle);
+  }
+
+  // The nodes beside one that a comparison asks for; false where it does not.
+  bool takeNodes(XQueryPlaceID place, XQueryPlaceID value, XQueryPlaceID nodes, bool isValueFirst) {
+    const XQueryPlaceID pathPlace = XQueryPlaceInside(_program, nodes);
+    if (_program[pathPlace].expr->kind() != Kind::PathExpr || !_program[value].slot) return false;
+    const XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, pathPlace);
+    if (!path || !XQueryNodesAside::isOpenFor(*path)) return false;
+    XQueryNodesAside::Operands operands{};
+    if (path->start()) {
+      const XQueryPlaceID source =
+          XQueryPlaceInside(_program, _program.part(pathPlace, XQueryRole::FirstStep));
+      const auto* variable =
+          source == XQueryNoPlace ? nullptr : dyn_cast<XQueryVariable>(_program[source].expr);
+      const bool isItem =
+          source != XQueryNoPlace && _program[source].expr->kind() == Kind::ContextItemExpr;
+      if (!isItem && (!variable || variable->varID() <= 0)) return false;
+      operands.varID = variable ? variable->varID() : 0;
+    }
+    const XQueryFacts& ofValue = _planning.facts[value];
+    const bool isOpen = canRepeat(ofValue) && (isValueFirst || !ofValue.does(XQueryDeeds::MayFail));
+    if (!isOpen || !operands.walk.readSteps(path->steps().front().step->next())) return false;
+    operands.value = *_program[value].slot;
+    operands.nodes = _planning.exprAt(pathPlace);
+    operands.path = path;
+    _planning.wrap(place,
+                   XQueryNodesAside::exprWithPlain(*_program[place].slot, std::move(operands)),
+                   "the first or the last node with that value is found in a table");
+    return true;
   }
 
   bool takeOver(XQueryPlaceID place, XQueryPlaceID value, XQueryPlaceID items, bool isValueFirst,

@@ -11,8 +11,23 @@
 #include "Plan/Operators/XQueryShortPath.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
+#include "Plan/Rules/PathAt.h"
 
 namespace xquery {
+namespace {
+
+// Whether a clause walks siblings and a condition stands behind it, which may pick them.
+bool isPickedFrom(const XQueryPlanning& planning, XQueryPlaceID place) {
+  const XQueryProgram& program = planning.program;
+  const XQueryPlace& at = program[place];
+  const XQueryWalkedPath* path = XQueryWalkedPathAt(planning, place);
+  if (at.role != XQueryRole::Bound || !path || !path->beginsWithSiblings()) return false;
+  const XQueryPlaceID next = program.nextPart(at.parent);
+  const XQueryRole role = next == XQueryNoPlace ? XQueryRole::Body : program[next].role;
+  return role == XQueryRole::Where || role == XQueryRole::Satisfies;
+}
+
+}  // namespace
 
 void XQueryShortenPaths(XQueryPlanning& planning) {
   for (XQueryPlaceID place = 0; place < planning.program.placeCount(); ++place) {
@@ -20,6 +35,7 @@ void XQueryShortenPaths(XQueryPlanning& planning) {
     if (!isa<XQueryPathExpr>(at.expr) || !planning.isOpen(place)) continue;
     XQueryShortWalk walk;
     if (!walk.readFrom(*at.expr) || !walk.visitsInOrder()) continue;
+    if (isPickedFrom(planning, place)) continue;
     planning.wrap(place, XQueryShortPath::exprWithPlain(*at.slot, walk));
   }
 }
