@@ -4,8 +4,10 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace xquery {
@@ -91,6 +93,34 @@ TEST_F(JoinPair, FindsWhatBothTablesFind) {
   }
 }
 
+TEST_F(JoinPair, FindsStretchesOfTheSameKeys) {
+  for (const auto& [keys, probes] :
+       {std::pair(prices, std::vector{number(-1), number(0), number(37), number(99.5), nan()}),
+        std::pair(currencies, std::vector{untyped("A"), untyped("E"), string("G"), string("x")})}) {
+    for (const Relation one : {less, notLess, greater}) {
+      for (const Relation other : {less, notLess, greater}) {
+        XQueryJoinTable first = tableOf(one, keys);
+        XQueryJoinTable second = tableOf(other, keys);
+        const auto pair = XQueryJoinPair::of(first, *first.questionOf(probes[1]), second,
+                                             *second.questionOf(probes[2]));
+        ASSERT_TRUE(pair);
+        for (const Value& low : probes) {
+          for (const Value& high : probes) {
+            const auto asked = first.questionOf(low);
+            const auto askedToo = second.questionOf(high);
+            if (!pair->answersFor(*asked, *askedToo)) continue;
+            const auto all = expected(first, *asked, second, *askedToo, keys.size());
+            XQueryJoinTable::Selection selection;
+            pair->select(*asked, *askedToo, true, false, selection);
+            EXPECT_EQ(selection, all);
+            EXPECT_EQ(pair->numberFor(*asked, *askedToo), all.size());
+          }
+        }
+      }
+    }
+  }
+}
+
 TEST_F(JoinPair, IsMadeOfAnEqualityAndOfItemsThatNeedNotBeAsked) {
   const auto isMade = [](Relation one, const std::vector<Value>& ofOne, const Value& askedOfOne,
                          Relation other, const std::vector<Value>& ofOther,
@@ -102,7 +132,14 @@ TEST_F(JoinPair, IsMadeOfAnEqualityAndOfItemsThatNeedNotBeAsked) {
   };
   EXPECT_TRUE(isMade(equal, currencies, untyped("E"), less, prices, number(1)));
   EXPECT_TRUE(isMade(equal, currencies, untyped("E"), equal, currencies, untyped("U")));
-  EXPECT_FALSE(isMade(less, prices, number(1), less, prices, number(1)));
+  EXPECT_TRUE(isMade(less, prices, number(1), greater, prices, number(1)));
+  EXPECT_TRUE(isMade(notLess, currencies, untyped("E"), less, currencies, untyped("U")));
+  EXPECT_FALSE(isMade(less, prices, number(1), equal, prices, number(1)));
+  std::vector<Value> others = prices;
+  others[7] = number(7.5);
+  EXPECT_FALSE(isMade(less, prices, number(1), greater, others, number(1)));
+  std::rotate(others.begin(), others.begin() + 1, others.end());
+  EXPECT_FALSE(isMade(less, prices, number(1), greater, others, number(1)));
   // Two keys of one item, a key that cannot be read, a text that is no number.
   prices[0] = sequence({number(1), number(2)});
   EXPECT_FALSE(isMade(equal, currencies, untyped("E"), less, prices, number(1)));

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <numeric>
 #include <span>
+#include <type_traits>
 
 namespace xquery {
 namespace {
@@ -24,15 +25,19 @@ uint32_t firstEqual(const Form& form, const Key& key) {
 
 std::unique_ptr<XQueryJoinPair> XQueryJoinPair::of(Table& first, const Question& askedOfFirst,
                                                    Table& second, const Question& askedOfSecond) {
-  if (!isOfRows(first) || second._isComplement) return nullptr;
+  const bool areOrders = isOfOrder(first) && isOfOrder(second);
+  if (!areOrders && (!isOfRows(first) || second._isComplement)) return nullptr;
   std::unique_ptr<XQueryJoinPair> made(
       new XQueryJoinPair(first, askedOfFirst.way, second, askedOfSecond.way));
   if (!made->answersFor(askedOfFirst, askedOfSecond)) return nullptr;
-  if (second._firstKeys.empty()) second.findKeysOfItems();
-  first.withForm(askedOfFirst, [&](auto& rows, const auto&) {
-    second.withForm(askedOfSecond,
-                    [&](const auto& others, const auto&) { made->fill(rows, others); });
-  });
+  if (areOrders && !made->takesStretches(askedOfFirst)) return nullptr;
+  if (!areOrders) {
+    if (second._firstKeys.empty()) second.findKeysOfItems();
+    first.withForm(askedOfFirst, [&](auto& rows, const auto&) {
+      second.withForm(askedOfSecond,
+                      [&](const auto& others, const auto&) { made->fill(rows, others); });
+    });
+  }
   made->_countedBytes = (made->_starts.size() + made->_keys.size()) * sizeof(uint32_t);
   countValueBytes(made->_countedBytes);
   return made;
@@ -47,6 +52,34 @@ bool XQueryJoinPair::answersFor(const Question& first, const Question& second) c
   const bool areOfWays = first.way == _firstWay && second.way == _secondWay;
   return areOfWays && first.way != Way::Nothing && second.way != Way::Nothing &&
          _first.hasOneAnswerFor(first) && _second.hasOneAnswerFor(second);
+}
+
+// All keys as one row, where both tables have the same ones; false where they have not.
+bool XQueryJoinPair::takesStretches(const Question& first) {
+  if (_firstWay != _secondWay || _first._positions != _second._positions) return false;
+  bool areSame = false;
+  _first.withForm(first, [&](const auto& form, const auto&) {
+    _second.withForm(first, [&](const auto& other, const auto&) {
+      if constexpr (std::is_same_v<decltype(form), decltype(other)>) {
+        WorkPacer pacer;
+        areSame = std::equal(form.keys.begin(), form.keys.end(), other.keys.begin(),
+                             other.keys.end(), [&pacer](const auto& a, const auto& b) {
+                               pacer.turn();
+                               const bool isNothing = XQueryMeetsNothing(a);
+                               return isNothing ? XQueryMeetsNothing(b) : XQueryAreEqualKeys(a, b);
+                             });
+        if (!areSame) return;
+        for (size_t key = 0; key < form.keys.size(); ++key) {
+          pacer.turn();
+          if (!XQueryMeetsNothing(form.keys[key])) _keys.push_back(static_cast<uint32_t>(key));
+        }
+        _starts = {0, static_cast<uint32_t>(_keys.size())};
+        sortRows(form.keys);
+      }
+    });
+  });
+  _areStretches = areSame;
+  return areSame;
 }
 
 template <class FirstKey, class SecondKey>
@@ -98,13 +131,17 @@ void XQueryJoinPair::sortRows(const std::vector<Key>& keys) {
 template <class Visit>
 void XQueryJoinPair::forEachMet(const Question& first, const Question& second, Visit visit) {
   const std::span<const uint32_t> all(_keys);
+  const auto rowOf = [&](const auto& rows, const auto& value) -> std::span<const uint32_t> {
+    if (_areStretches) return _first.metAmong(_first._relation, value, rows.keys, all);
+    const uint32_t row = firstEqual(rows, value);
+    if (row == noKey) return {};
+    return all.subspan(_starts[row], _starts[row + 1] - _starts[row]);
+  };
   WorkPacer pacer;
   _first.withForm(first, [&](auto& rows, const auto& values) {
     _second.withForm(second, [&](const auto& others, const auto& probes) {
       for (const auto& value : values) {
-        const uint32_t row = firstEqual(rows, value);
-        if (row == noKey) continue;
-        const auto own = all.subspan(_starts[row], _starts[row + 1] - _starts[row]);
+        const auto own = rowOf(rows, value);
         // Of an order one probe decides.
         for (const auto& probe : probes) {
           pacer.turn();

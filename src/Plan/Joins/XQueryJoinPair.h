@@ -2,6 +2,9 @@
 // second in rows, a row for each value of the first, sorted. Which items of a row meet a probe of
 // the second is then found by binary search. Of "$b/@currency = $a/@currency and $b/price >
 // $a/price" either table alone picks a large part of all the books for each $a.
+//
+// Or both are orders of the same keys: then these are one row, of which the first comparison leaves
+// a stretch, and the second a stretch of that, as in "$b/price > $a/low and $b/price < $a/high".
 #pragma once
 
 #include "Plan/Joins/XQueryJoinTable.h"
@@ -29,6 +32,10 @@ class XQueryJoinPair {
   static bool isOfRows(const Table& table) {
     return table._relation.test == XQueryRelation::Equal && !table._isComplement;
   }
+  static bool isOfOrder(const Table& table) {
+    return table._relation.test != XQueryRelation::Equal && !table._isComplement &&
+           !table._isPrefix && !table._isIdentity;
+  }
   // Whether the questions are of the kinds that it was made for.
   bool answersFor(const Question& first, const Question& second) const;
   // How many items meet both.
@@ -42,6 +49,7 @@ class XQueryJoinPair {
   XQueryJoinPair(Table& first, Table::Way firstWay, Table& second, Table::Way secondWay)
       : _first(first), _second(second), _firstWay(firstWay), _secondWay(secondWay) {}
 
+  bool takesStretches(const Question& first);
   template <class FirstKey, class SecondKey>
   void fill(Table::Form<FirstKey>& first, const Table::Form<SecondKey>& second);
   template <class Key>
@@ -57,6 +65,7 @@ class XQueryJoinPair {
   // Of the row of each key of the first table that is the first of its value, and the end.
   std::vector<uint32_t> _starts;
   std::vector<uint32_t> _keys;  // of the second table, row after row
+  bool _areStretches = false;
   size_t _countedBytes = 0;
 };
 

@@ -13,7 +13,9 @@ void XQueryGiveItems(const Value& list, XQueryItemGiver::Taker& taker) {
 
 bool XQueryShortPathGiver::giveItems(XQueryContext& context, Taker& taker) const {
   auto& dynamic = _internal(context);
-  if (NSXMLNode* const start = _walk.start(context); start && !dynamic.showsErrors()) {
+  const bool arePicked = _walked && _walked->picker();
+  NSXMLNode* const start = arePicked ? nullptr : _walk.start(context);
+  if (start && !dynamic.showsErrors()) {
     // The variable that it starts from may be the one that takes the nodes.
     const Value held(start);
     XQueryAsk(*_path, context, [&] {

@@ -25,17 +25,20 @@ class XQueryWalkedPathGiver final : public XQueryItemGiver {
   const Ref<XQueryWalkedPath> _path;
 };
 
-// For a short path whose walk visitsInOrder.
+// For a short path whose walk visitsInOrder. Where a picker is set later for what it walks, that
+// picks the items; `walked` may be null.
 class XQueryShortPathGiver final : public XQueryItemGiver {
  public:
-  XQueryShortPathGiver(Ref<XQueryExpr> path, const XQueryShortWalk& walk)
-      : _path(std::move(path)), _walk(walk) {}
+  XQueryShortPathGiver(Ref<XQueryExpr> path, const XQueryShortWalk& walk,
+                       Ref<XQueryWalkedPath> walked)
+      : _path(std::move(path)), _walk(walk), _walked(std::move(walked)) {}
 
   bool giveItems(XQueryContext& context, Taker& taker) const override;
 
  private:
   const Ref<XQueryExpr> _path;
   const XQueryShortWalk _walk;
+  const Ref<XQueryWalkedPath> _walked;
 };
 
 // Gives what is in a list.

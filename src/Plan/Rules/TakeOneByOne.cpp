@@ -35,7 +35,8 @@ std::unique_ptr<const XQueryItemGiver> giverOf(const XQueryPlanning& planning,
   if (!path) return nullptr;
   if (XQueryShortWalk walk; walk.readFrom(*path)) {
     if (!walk.visitsInOrder()) return nullptr;
-    return std::make_unique<XQueryShortPathGiver>(planning.exprAt(place), walk);
+    return std::make_unique<XQueryShortPathGiver>(planning.exprAt(place), walk,
+                                                  Ref<XQueryWalkedPath>(path));
   }
   if (!path->findsInOrder() || path->steps().empty()) return nullptr;
   return std::make_unique<XQueryWalkedPathGiver>(Ref<XQueryWalkedPath>(path));
