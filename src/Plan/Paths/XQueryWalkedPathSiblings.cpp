@@ -40,7 +40,7 @@ bool hasManySiblings(const NSXMLNode* node, int axis) {
   return node != nullptr;
 }
 
-bool isBefore(const NSXMLNode* a, const NSXMLNode* b) {
+bool standsBefore(const NSXMLNode* a, const NSXMLNode* b) {
   return NSXMLNodeOrder::number(*a) < NSXMLNodeOrder::number(*b);
 }
 
@@ -90,9 +90,9 @@ bool XQueryWalkedPath::leaveOnOneSide(const NSXMLNode* node, XQueryPicks& picks)
     return cast<NSXMLNode>((*picks.items)[pick.position].get());
   };
   if (!areComparable(node, nodeAt(picks.chosen.front()))) return false;
-  const auto border =
-      std::partition_point(picks.chosen.begin(), picks.chosen.end(),
-                           [&](const XQueryPick& pick) { return isBefore(nodeAt(pick), node); });
+  const auto border = std::partition_point(
+      picks.chosen.begin(), picks.chosen.end(),
+      [&](const XQueryPick& pick) { return standsBefore(nodeAt(pick), node); });
   if (goesBack(_steps.front().axis)) {
     picks.chosen.erase(border, picks.chosen.end());
     std::reverse(picks.chosen.begin(), picks.chosen.end());
@@ -144,9 +144,9 @@ bool XQueryWalkedPath::takeSiblings(const Value& start, XQueryPathWalk& walk) co
   auto first = siblings->nodes.begin();
   auto end = siblings->nodes.end();
   if (goesBack(step.axis)) {
-    end = std::lower_bound(first, end, node, isBefore);
+    end = std::lower_bound(first, end, node, standsBefore);
   } else {
-    first = std::upper_bound(first, end, node, isBefore);
+    first = std::upper_bound(first, end, node, standsBefore);
   }
   if (isCounted) {
     walk.results.addNumber(static_cast<uint64_t>(end - first));

@@ -238,6 +238,31 @@ class Search {
 
   using Above = XQueryKeptExpr::Above;
 
+  // Whether a path goes up from an item first.
+  bool isPathAbove(XQueryPlaceID place) const {
+    const auto* path = dyn_cast<XQueryPathExpr>(at(place).expr);
+    const XQueryStep* step = path ? path->step() : nullptr;
+    if (step && !isa<XQueryAxisStep>(step)) {
+      step = isAtHand(XQueryWithoutParentheses(step->expr())) ? step->next() : nullptr;
+    }
+    const auto* axisStep = dyn_cast<XQueryAxisStep>(step);
+    return axisStep && axisStep->axis() == XQueryAxisParent;
+  }
+
+  // The same for a call that goes through the items of such a path. What consists of more keeps
+  // those of its parts that are the same for all items, which is worth more.
+  bool beginsAbove(XQueryPlaceID place) const {
+    const auto* call = dyn_cast<XQueryFunctionCall>(at(place).expr);
+    if (!call) return isPathAbove(place);
+    if (!goesThroughItems(*call)) return false;
+    const XQueryPlaceID arguments = _program.part(place, XQueryRole::Arguments);
+    XQueryPlaceID each = arguments == XQueryNoPlace ? arguments : _program.firstPart(arguments);
+    for (; each != XQueryNoPlace; each = _program.nextPart(each)) {
+      if (!isPathAbove(XQueryPlaceInside(_program, each))) return false;
+    }
+    return true;
+  }
+
   // What it reads by way of parents, where it is invariant but for that; none for others.
   std::vector<Above> readAbove(XQueryPlaceID place) const {
     XQueryFacts own = facts(place);
@@ -247,6 +272,7 @@ class Search {
       if (steps > 0) above.push_back({varID, steps});
       return steps > 0;
     };
+    if (!beginsAbove(place)) return {};
     // A tree without a document may be changed by what is constructed: nothing is kept of it.
     if (!own.does(XQueryDeeds::ReadsOutside) || !own.reads.isExact()) return {};
     if (own.does(XQueryDeeds::ReadsItem) && add(0)) own.deeds &= ~unsigned{XQueryDeeds::ReadsItem};
