@@ -82,7 +82,7 @@ constexpr std::array rules = {
                XQueryAskEarly},
     // Before what calls these functions with machine numbers.
     XQueryRule{"functions",
-               "functions of numbers are computed with machine numbers, calls included",
+               "functions of numbers, texts and lists are computed without objects, calls included",
                XQueryComputeFunctions},
     XQueryRule{"scalars", "arithmetic, comparisons and logic over numbers make no objects between",
                XQueryComputeScalars},

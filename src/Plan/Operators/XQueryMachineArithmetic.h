@@ -25,6 +25,12 @@ inline std::optional<int64_t> XQueryIntegerResult(int type, int64_t a, int64_t b
     case XQueryOperatorMod:
       // Dividing by -1 is left out: the smallest integer has no counterpart.
       if (b == 0 || b == -1) return std::nullopt;
+      // Dividing halves of words takes a fraction of the time.
+      if (((static_cast<uint64_t>(a) | static_cast<uint64_t>(b)) >> 32) == 0) {
+        const auto dividend = static_cast<uint32_t>(a);
+        const auto divisor = static_cast<uint32_t>(b);
+        return type == XQueryOperatorIDiv ? dividend / divisor : dividend % divisor;
+      }
       return type == XQueryOperatorIDiv ? a / b : a % b;
     default:
       return std::nullopt;

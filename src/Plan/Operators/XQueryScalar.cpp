@@ -1,10 +1,18 @@
 #include "Plan/Operators/XQueryScalar.h"
 
 #include "Expr/Operators/XQueryComparison.h"
+#include "Expr/XQueryListChanges.h"
+#include "Expr/XQuerySequence.h"
 #include "Plan/Operators/XQueryMachineArithmetic.h"
+#include "Plan/Operators/XQueryScalarText.h"
+#include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryNumericOperand.h"
+#include "Types/XQueryString.h"
+#include "xquery/Collection.h"
 
 #include <cmath>
+#include <utility>
+#include <vector>
 
 namespace xquery {
 namespace {
@@ -14,8 +22,8 @@ using Form = XQueryScalar::Form;
 
 // An operand of arithmetic: the number that an object holds, or is cast to when it is untyped.
 Scalar numberIn(const Scalar& operand, bool untypedOnes) {
-  if (operand.form == Form::Truth) return {};
-  if (operand.form != Form::Object) return operand;
+  if (operand.form == Form::Integer || operand.form == Form::Double) return operand;
+  if (operand.form != Form::Object) return {};
   const auto number = XQueryNumericOperand::of(operand.object, untypedOnes);
   if (number.form == XQueryNumericOperand::Double) return Scalar::ofDouble(number.number);
   const bool isSmall = number.form == XQueryNumericOperand::Exact && number.isInteger &&
@@ -59,8 +67,8 @@ Scalar related(XQueryRelation relation, T a, T b) {
 
 }  // namespace
 
-// Of typed numbers alone; no relation holds for what is not a number.
-XQueryScalar XQueryScalarComparison(int code, const Scalar& left, const Scalar& right) {
+// No relation holds for what is not a number.
+XQueryScalar XQueryScalarNumberComparison(int code, const Scalar& left, const Scalar& right) {
   const Scalar a = numberIn(left, false);
   const Scalar b = numberIn(right, false);
   if (a.form == Form::Unknown || b.form == Form::Unknown) return {};
@@ -75,6 +83,44 @@ XQueryScalar XQueryScalarComparison(int code, const Scalar& left, const Scalar& 
   return related(relation, x, y);
 }
 
+// Untyped texts and those of type xs:string are compared as strings, and so are all string types.
+XQueryScalar XQueryScalarComparison(int code, const Scalar& left, const Scalar& right) {
+  const bool isNumber = left.form == Form::Integer || left.form == Form::Double;
+  if (isNumber) return XQueryScalarNumberComparison(code, left, right);
+  const XQueryScalarText a(left);
+  if (!a.isItem()) return XQueryScalarNumberComparison(code, left, right);
+  const XQueryScalarText b(right);
+  if (!a.comparesWith(b)) return {};
+  const XQueryRelation relation = XQueryRelationForCode(code);
+  if (relation.test != XQueryRelation::Equal) {
+    return Scalar::ofTruth(relation.holds(a.view().compare(b.view())));
+  }
+  return Scalar::ofTruth(a.view().equals(b.view()) != relation.negated);
+}
+
+// In the order of the pairs, of which the first one that holds decides.
+XQueryScalar XQueryScalarGeneralComparison(int code, const Scalar& left, const Scalar& right) {
+  if (left.form != Form::Items && right.form != Form::Items) {
+    return XQueryScalarComparison(code, left, right);
+  }
+  if (left.form == Form::Unknown || right.form == Form::Unknown) return {};
+  if (left.isNothing() || right.isNothing()) return Scalar::ofNothing();
+  WorkPacer pacer;
+  for (uint32_t i = 0; i < XQueryScalarCount(left); ++i) {
+    const Scalar a = XQueryScalarItem(left, i);
+    for (uint32_t j = 0; j < XQueryScalarCount(right); ++j) {
+      pacer.turn();
+      const Scalar holds = XQueryScalarComparison(code, a, XQueryScalarItem(right, j));
+      if (holds.form != Form::Truth || holds.truth) return holds;
+    }
+  }
+  return Scalar::ofTruth(false);
+}
+
+XQueryScalar XQueryScalarNumber(const Scalar& value) {
+  return numberIn(value, false);
+}
+
 XQueryScalar XQueryScalarTruth(const Scalar& value) {
   switch (value.form) {
     case Form::Truth:
@@ -83,6 +129,82 @@ XQueryScalar XQueryScalarTruth(const Scalar& value) {
       return Scalar::ofTruth(value.integer != 0);
     case Form::Double:
       return Scalar::ofTruth(value.number != 0 && !std::isnan(value.number));
+    case Form::Text:
+    case Form::Items:
+      return Scalar::ofTruth(value.length != 0);
+    case Form::Object: {
+      if (const auto* string = dyn_cast<NSString>(value.object)) {
+        return Scalar::ofTruth(string->length() != 0);
+      }
+      const Scalar number = numberIn(value, false);
+      return number.form == Form::Unknown ? number : XQueryScalarTruth(number);
+    }
+    default:
+      return {};
+  }
+}
+
+// --- texts and lists -----------------------------------------------------------------------------
+
+XQueryScalar XQueryScalar::ofNothing() {
+  return ofItems(NSNull::null(), 0, 0);
+}
+
+// An array of fewer than two items is none of the values that variables hold.
+XQueryScalar XQueryScalar::ofValue(const NSObject* value) {
+  if (!value) return {};
+  if (value->kind() == Kind::TypedNumber || value->isNode() || isa<NSString>(value)) {
+    return ofObject(value);
+  }
+  if (value == NSNumber::trueValue()) return ofTruth(true);
+  if (value == NSNumber::falseValue()) return ofTruth(false);
+  if (value->kind() == Kind::Null) return ofNothing();
+  if (const auto* array = dyn_cast<NSArray>(value)) {
+    const size_t count = array->count();
+    if (count < 2 || count > UINT32_MAX) return {};
+    return ofItems(array, 0, static_cast<uint32_t>(count));
+  }
+  return XQueryIsAtomicType(value) ? ofObject(value) : XQueryScalar();
+}
+
+// What stands in an array as an item is one, but in arrays of hosts.
+XQueryScalar XQueryScalarItem(const Scalar& list, uint32_t index) {
+  if (list.form != Form::Items) return list;
+  const auto* array = cast<NSArray>(list.object);
+  const Scalar item = Scalar::ofValue(array->objectAtIndex(size_t{list.start} + index));
+  return item.form == Form::Items ? Scalar() : item;
+}
+
+namespace {
+
+Value valueOfItems(const Scalar& items) {
+  if (items.length == 0) return NSNull::null();
+  const auto* array = cast<NSArray>(items.object);
+  if (items.length == array->count()) return const_cast<NSArray*>(array);
+  std::vector<Value> part;
+  XQueryAppendItems(array->objects(), items.start, items.length, part);
+  if (array->kind() != Kind::Sequence) return NSArray::arrayWithObjects(std::move(part));
+  auto sequence = XQuerySequence::sequence();
+  sequence->objects() = std::move(part);
+  return sequence;
+}
+
+}  // namespace
+
+Value XQueryScalarValue(const Scalar& value) {
+  switch (value.form) {
+    case Form::Integer:
+      return XQueryNumber::integerWithInt64(value.integer);
+    case Form::Double:
+      return XQueryNumber::numberWithDouble(value.number);
+    case Form::Truth:
+      return NSNumber::numberWithBool(value.truth);
+    case Form::Object:
+      return const_cast<NSObject*>(value.object);
+    case Form::Text:
+      return XQueryString::stringWithView(XQueryScalarText(value).view());
+    case Form::Items:
+      return valueOfItems(value);
     default:
       return {};
   }

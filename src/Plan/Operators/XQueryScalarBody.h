@@ -1,4 +1,5 @@
-// The body of a declared function that is computed with machine numbers (XQueryScalarProgram).
+// The body of a declared function that is computed with machine numbers, texts and lists
+// (XQueryScalarProgram).
 #pragma once
 
 #include "Expr/XQueryLeaves.h"
@@ -34,12 +35,11 @@ class XQueryScalarBody : public XQueryPlannedExpr {
   const XQueryScalarBody* scalarBody() const override { return this; }
 
   // What the function answers for these arguments, which are overwritten; Unknown where the body
-  // has to be evaluated. Throws where a limit of the evaluation is reached.
-  XQueryScalar answer(XQueryScalar* arguments) const;
+  // has to be evaluated. `made` takes what the answer refers to, where that was made on the way.
+  // Throws where a limit of the evaluation is reached.
+  XQueryScalar answer(XQueryScalar* arguments, Value& made) const;
   // The literal that was answered; null for another answer.
   Value literalAnswered(const XQueryScalar& answer, XQueryContext& context) const;
-  // Of an argument: Unknown for what is neither a number nor a truth value.
-  static XQueryScalar scalarOf(const NSObject* argument);
 
  protected:
   XQueryScalarBody(Ref<XQueryExpr> plain, std::shared_ptr<const Program> program,
@@ -56,8 +56,6 @@ class XQueryScalarBody : public XQueryPlannedExpr {
   // called for something else than these numbers is soon left to the plain way. Written where
   // nothing is known only, so that threads which share a plan do not wait for each other.
   static constexpr uint32_t mostFailures = 32;
-
-  Value valueOf(const XQueryScalar& answer, XQueryContext& context) const;
 
   const std::shared_ptr<const Program> _program;
   const XQueryScalarProgram::Index _function;

@@ -67,19 +67,23 @@ class XQueryScalarSteps {
   size_t count() const { return _steps.size(); }
   const Step& operator[](size_t index) const { return _steps[index]; }
 
-  // What the last step comes to; Unknown, among others, for an object. Throws where a call reaches
-  // a limit of the evaluation.
-  XQueryScalar answer(const XQueryContext& context) const;
-  // The same where an object is wanted as well, of which there is more to be known.
-  XQueryScalar answerOrObject(const XQueryContext& context) const;
+  // Objects that calls have answered, which values refer to.
+  using Made = std::vector<Value>;
+
+  // What the last step comes to. An object may be a variable's, of whatever shape, unless a call
+  // has answered it. `made` takes what the answer refers to, where that was made on the way. Throws
+  // where a call reaches a limit of the evaluation.
+  XQueryScalar answer(const XQueryContext& context, Made& made) const;
+  // Whether it is a literal that is passed to a function, which may answer it.
+  bool isConstant(const NSObject* object) const;
   // The body of the function that is called last, if the last step is a call; otherwise null.
   const XQueryScalarBody* callee() const { return _steps.back().body; }
 
  private:
-  XQueryScalar valueOf(Index index, const XQueryContextInternal& context) const;
-  XQueryScalar operand(Index index, const XQueryContextInternal& context) const;
-  XQueryScalar logic(const Step& step, const XQueryContextInternal& context) const;
-  XQueryScalar called(const Step& step, const XQueryContextInternal& context) const;
+  XQueryScalar valueOf(Index index, const XQueryContextInternal& context, Made& made) const;
+  XQueryScalar operand(Index index, const XQueryContextInternal& context, Made& made) const;
+  XQueryScalar logic(const Step& step, const XQueryContextInternal& context, Made& made) const;
+  XQueryScalar called(const Step& step, const XQueryContextInternal& context, Made& made) const;
 
   std::vector<Step> _steps;
   std::vector<Index> _operands;
@@ -106,6 +110,7 @@ class XQueryScalarExpr : public XQueryPlannedExpr,
   friend Ref<T> make(Arguments&&...);
 
  private:
+  Value valueOf(const XQueryScalar& answer, XQueryContext& context) const;
   bool yieldAnswer(const XQueryScalar& answer, XQueryItemFold& fold, XQueryContext& context) const;
 
   const XQueryScalarSteps _steps;

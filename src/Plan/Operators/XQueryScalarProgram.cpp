@@ -56,12 +56,17 @@ struct XQueryScalarProgram::Run {
   // which ends with an error if they do not.
   static constexpr int mostLastCalls = 100'000;
 
+  // So many objects are made by calls in a row before those are dropped that none refers to.
+  static constexpr size_t manyObjects = 64;
+
   const XQueryScalarProgram& program;
   bool outOfStack = false;
+  XQueryScalarsMade made;
 
   // Slots and terms are those of one call, whose answer is that of its last term.
   Scalar call(const Function* function, Scalar* slots) {
     int lastCalls = 0;
+    const size_t begin = made.size();
     const Term* term = &program._terms[function->body];
     while (true) {
       switch (term->kind) {
@@ -76,6 +81,7 @@ struct XQueryScalarProgram::Run {
           checkWork();
           Scalar arguments[mostSlots];
           if (outOfStack || !evaluateOperands(*term, slots, arguments)) return {};
+          if (made.size() > begin + manyObjects) keepFor(arguments, term->code, begin);
           std::copy_n(arguments, term->code, slots);
           function = &program._functions[term->left];
           term = &program._terms[function->body];
@@ -88,9 +94,21 @@ struct XQueryScalarProgram::Run {
     }
   }
 
+  // Drops the objects behind the first ones but for what these values refer to.
+  [[gnu::noinline]] void keepFor(const Scalar* values, size_t count, size_t begin) {
+    const auto isUnused = [&](const Value& object) {
+      return std::none_of(values, values + count, [&](const Scalar& value) {
+        return value.hasObject() && value.object == object.get();
+      });
+    };
+    const auto first = made.begin() + static_cast<std::ptrdiff_t>(begin);
+    made.erase(std::remove_if(first, made.end(), isUnused), made.end());
+  }
+
   // Null where nothing is known.
   const Term* branchOf(const Term& conditional, Scalar* slots) {
-    const Scalar truth = XQueryScalarTruth(value(program._terms[conditional.left], slots));
+    Scalar truth = value(program._terms[conditional.left], slots);
+    if (truth.form != Form::Truth) truth = XQueryScalarTruth(truth);
     if (truth.form == Form::Unknown) return nullptr;
     return &program._terms[truth.truth ? conditional.right : conditional.third];
   }
@@ -126,10 +144,20 @@ struct XQueryScalarProgram::Run {
         return term.kind == Kind::Arithmetic ? arithmetic(term.code, left, right)
                                              : comparison(term.code, left, right);
       }
+      case Kind::General: {
+        const Scalar left = value(program._terms[term.left], slots);
+        if (left.form == Form::Unknown) return left;
+        const Scalar right = value(program._terms[term.right], slots);
+        return left.form == Form::Integer && right.form == Form::Integer
+                   ? comparison(term.code, left, right)
+                   : XQueryScalarGeneralComparison(term.code, left, right);
+      }
       case Kind::And:
       case Kind::Or:
       case Kind::Not:
         return logic(term, slots);
+      case Kind::BuiltIn:
+        return builtIn(term, slots);
       case Kind::Conditional: {
         const Term* branch = branchOf(term, slots);
         return branch ? value(*branch, slots) : Scalar();
@@ -158,14 +186,33 @@ struct XQueryScalarProgram::Run {
     int64_t distance = 0;
     const bool isFar = __builtin_sub_overflow(last.integer, first.integer, &distance);
     if (isFar || distance > mostIntegers) return {};
+    const size_t begin = made.size();
     // Counted by distance: the last integer may be the greatest there is.
     for (int64_t offset = 0; offset <= distance; ++offset) {
       checkWork();
+      made.resize(begin);
       slots[term.code] = Scalar::ofInteger(first.integer + offset);
       const Scalar holds = XQueryScalarTruth(value(program._terms[term.third], slots));
       if (holds.form == Form::Unknown || holds.truth != ofEvery) return holds;
     }
     return Scalar::ofTruth(ofEvery);
+  }
+
+  // Most have few operands.
+  Scalar builtIn(const Term& term, Scalar* slots) {
+    return term.right <= 2 ? builtInOf<2>(term, slots)
+                           : builtInOf<XQueryMostScalarArguments>(term, slots);
+  }
+
+  template <size_t most>
+  [[gnu::noinline]] Scalar builtInOf(const Term& term, Scalar* slots) {
+    Scalar operands[most];
+    for (size_t index = 0; index < term.right; ++index) {
+      operands[index] = value(program._terms[program._operands[term.left + index]], slots);
+      if (operands[index].form == Form::Unknown) return {};
+    }
+    return XQueryScalarAnswer(static_cast<XQueryScalarFunction>(term.code),
+                              {operands, size_t{term.right}}, made);
   }
 
   // The operand behind one that decides is not looked at.
@@ -183,17 +230,24 @@ struct XQueryScalarProgram::Run {
       if (outOfStack) return {};
     }
     checkWork();
+    const size_t begin = made.size();
     Scalar arguments[mostSlots];
     if (!evaluateOperands(term, slots, arguments)) return {};
-    return call(&program._functions[term.left], arguments);
+    const Scalar answer = call(&program._functions[term.left], arguments);
+    if (made.size() > begin) keepFor(&answer, 1, begin);
+    return answer;
   }
 };
 
-XQueryScalar XQueryScalarProgram::answer(Index function, XQueryScalar* slots,
+XQueryScalar XQueryScalarProgram::answer(Index function, XQueryScalar* slots, Value& made,
                                          bool& outOfStack) const {
-  Run run{*this};
+  Run run{*this, false, {}};
   const Scalar answer = run.call(&_functions[function], slots);
   outOfStack = run.outOfStack;
+  if (!run.made.empty() && answer.hasObject()) {
+    run.keepFor(&answer, 1, 0);
+    if (!run.made.empty()) made = std::move(run.made.front());
+  }
   return answer;
 }
 

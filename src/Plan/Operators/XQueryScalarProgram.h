@@ -1,16 +1,24 @@
-// Declared functions over numbers, computed with machine numbers.
+// Declared functions over numbers, texts and lists, computed with machine numbers and with parts of
+// texts and lists that are not made objects.
 //
 //   declare function local:gcd($a, $b) { if ($b = 0) then $a else local:gcd($b, $a mod $b) };
+//   declare function local:sum($l) { if (empty($l)) then 0 else $l[1] + local:sum(subsequence($l,
+//   2)) };
 //
 // A body of literals, parameters, let variables, arithmetic, comparisons, logic, conditionals,
-// quantifiers over ranges and calls of functions like it becomes a tree of terms. A call computes
-// with slots on the stack in place of a frame of variables, and neither arguments nor answers are
-// made objects. Wherever an operand is something else than these numbers, an integer leaves its
-// word, there would be an error or the stack ends, nothing is known, and the body is evaluated as
-// it was written: terms do nothing that could be told.
+// quantifiers over ranges, items of lists by their positions, calls of some built-in functions
+// (XQueryScalarFunctions.h) and of functions like it becomes a tree of terms. A call computes with
+// slots on the stack in place of a frame of variables, and neither arguments nor answers are made
+// objects. Wherever an operand is something else than these values, an integer leaves its word,
+// there would be an error or the stack ends, nothing is known, and the body is evaluated as it was
+// written: terms do nothing that could be told.
+//
+// What values refer to is held by the caller of the whole, or kept while the values may be used:
+// what a call has made goes with it, but for its answer.
 #pragma once
 
 #include "Plan/Operators/XQueryScalar.h"
+#include "Plan/Operators/XQueryScalarFunctions.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -30,6 +38,7 @@ class XQueryScalarProgram {
     Slot,         // code: which one
     Arithmetic,   // code: the operator; a sign's left operand is the constant 0
     Comparison,   // code: the value comparison
+    General,      // code: the value comparison of each pair of items
     And,          // left, right
     Or,           // left, right
     Not,          // left
@@ -39,6 +48,7 @@ class XQueryScalarProgram {
     // Over the integers of a range: code: the slot; left, right: the bounds; third: what is asked
     // of each; constant: whether of every one.
     Quantifier,
+    BuiltIn,  // code: the function; left: the first of its operands; right: their number
   };
   struct Term {
     Kind kind = Kind::Constant;
@@ -68,9 +78,10 @@ class XQueryScalarProgram {
   size_t operandCount() const { return _operands.size(); }
   const Function& function(Index index) const { return _functions[index]; }
 
-  // What a function answers for arguments in `slots`, which are overwritten. `outOfStack` is set
-  // where that is why nothing is known. Throws where a limit of the evaluation is reached.
-  XQueryScalar answer(Index function, XQueryScalar* slots, bool& outOfStack) const;
+  // What a function answers for arguments in `slots`, which are overwritten; `made` takes what the
+  // answer refers to, where that was made on the way. `outOfStack` is set where that is why nothing
+  // is known. Throws where a limit of the evaluation is reached.
+  XQueryScalar answer(Index function, XQueryScalar* slots, Value& made, bool& outOfStack) const;
 
  private:
   struct Run;

@@ -1,18 +1,21 @@
-// Declared functions over numbers.
+// Declared functions over numbers, texts and lists.
 //
-// Pattern     a function whose body consists of integer and double literals, true() and false(),
-//             its parameters, let variables without a type, arithmetic, comparisons, "and", "or",
-//             not(), conditionals, quantifiers over one range and calls of functions for which the
-//             same holds
+// Pattern     a function whose body consists of integer, double and string literals, true() and
+//             false(), its parameters, let variables without a type, arithmetic, comparisons,
+//             "and", "or", not(), conditionals, quantifiers over one range, items by position, as
+//             in $l[1] and $l[position() > $n], (), built-in functions of XQueryScalarFunctions.h
+//             and calls of functions for which the same holds
 // Facts       each variable is read where it is surely set, by a parameter or a clause around it
-// Refused     functions of many parameters and variables, and very long ones
+// Refused     functions of many parameters and variables, and very long ones; what stands between
+//             commas, as lists that grow are better off where they are changed in place
 // Operator    XQueryScalarBody
-// Why         nothing that is computed can be told from outside but the answer; where machine
-//             numbers do not tell, the body is evaluated as it was written, with the same arguments
+// Why         nothing that is computed can be told from outside but the answer; where it is not
+//             known, the body is evaluated as it was written, with the same arguments
 #include "Expr/Clauses/XQueryConditional.h"
 #include "Expr/Clauses/XQueryFLWOR.h"
 #include "Expr/Clauses/XQueryQuantified.h"
 #include "Expr/Operators/XQueryOperatorExpr.h"
+#include "Expr/Paths/XQueryPath.h"
 #include "Expr/XQueryLeaves.h"
 #include "Functions/Boolean.h"
 #include "Functions/XQueryFunctionCall.h"
@@ -20,6 +23,7 @@
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
 #include "Plan/Rules/PlaceInside.h"
+#include "Plan/Rules/PositionConditions.h"
 #include "Prolog/XQueryDeclarations.h"
 #include "Types/XQueryNumericOperand.h"
 
@@ -39,6 +43,31 @@ using Added = std::optional<Terms::Index>;
 
 // The classes of operators, as XQueryOperatorExpr::operatorClassification numbers them.
 constexpr int logicalClass = 1, arithmeticClass = 2, valueClass = 5, generalClass = 6;
+
+using BuiltIn = XQueryScalarFunction;
+
+// Which items a comparison with position() keeps; nothing for "!=".
+std::optional<BuiltIn> itemsKeptBy(int comparison) {
+  switch (comparison) {
+    case XQueryOperatorEqual:
+    case XQueryOperatorEq:
+      return BuiltIn::Item;
+    case XQueryOperatorGreater:
+    case XQueryOperatorGt:
+      return BuiltIn::ItemsAbove;
+    case XQueryOperatorGreaterEqual:
+    case XQueryOperatorGe:
+      return BuiltIn::ItemsFrom;
+    case XQueryOperatorLess:
+    case XQueryOperatorLt:
+      return BuiltIn::ItemsBelow;
+    case XQueryOperatorLessEqual:
+    case XQueryOperatorLe:
+      return BuiltIn::ItemsUpTo;
+    default:
+      return std::nullopt;
+  }
+}
 
 using FunctionIndexes = std::map<const XQueryFunctionDecl*, Terms::Index>;
 
@@ -86,6 +115,11 @@ class Compiler {
         return addConditional(place, use, level + 1);
       case Kind::QuantifiedExpr:
         return addQuantifier(place, *cast<XQueryQuantifiedExpr>(&expr), level + 1);
+      case Kind::PathExpr:
+        return addPositions(place, *cast<XQueryPathExpr>(&expr), level + 1);
+      case Kind::ExprList:
+        if (_program.firstPart(place) != XQueryNoPlace) return {};
+        return addConstant(XQueryScalar::ofNothing());
       case Kind::FLWORExpr:
         return addLets(place, *cast<XQueryFLWORExpr>(&expr), use, level + 1);
       default:
@@ -96,6 +130,11 @@ class Compiler {
   // Of one that may be the answer the object matters.
   Added addLiteral(XQueryLiteral& literal, Use use) {
     const NSObject* value = literal.literalValue().get();
+    if (isa<NSNull>(value)) return addConstant(XQueryScalar::ofNothing());
+    if (isa<NSString>(value)) {
+      if (use == Use::Answer) _into.literals.emplace_back(&literal);
+      return addConstant(XQueryScalar::ofObject(value));
+    }
     const auto number = XQueryNumericOperand::of(value, false);
     const bool isInteger = number.form == XQueryNumericOperand::Exact && number.isInteger &&
                            number.exact->isSmallInteger();
@@ -149,7 +188,7 @@ class Compiler {
         term.kind = TermKind::Comparison;
         break;
       case generalClass:
-        term.kind = TermKind::Comparison;
+        term.kind = TermKind::General;
         term.code = static_cast<uint8_t>(type + XQueryOperatorEq - XQueryOperatorEqual);
         break;
       default:
@@ -178,19 +217,86 @@ class Compiler {
     if (call.builtIn()) return addBuiltIn(call, first, level);
     const auto function = _functions.find(call.functionDecl());
     if (!call.hasBody() || function == _functions.end()) return {};
-    std::vector<Terms::Index> operands;
-    for (XQueryPlaceID each = first; each != XQueryNoPlace; each = _program.nextPart(each)) {
-      const Added added = add(each, Use::Answer, level);
-      if (!added) return {};
-      operands.push_back(*added);
-    }
+    const auto operands = addOperands(first, Use::Answer, level);
+    if (!operands) return {};
     Terms::Term term;
     term.kind = TermKind::Call;
-    term.code = static_cast<uint8_t>(operands.size());
+    term.code = static_cast<uint8_t>(operands->size());
     term.left = function->second;
-    if (_into.scalars.operandCount() + operands.size() >= Terms::mostTerms) return {};
-    term.right = _into.scalars.addOperands(operands);
+    if (_into.scalars.operandCount() + operands->size() >= Terms::mostTerms) return {};
+    term.right = _into.scalars.addOperands(*operands);
     return _into.scalars.add(term);
+  }
+
+  using Operands = std::vector<Terms::Index>;
+
+  // Of the place and those behind it in the same whole.
+  std::optional<Operands> addOperands(XQueryPlaceID first, Use use, int level) {
+    Operands operands;
+    for (XQueryPlaceID each = first; each != XQueryNoPlace; each = _program.nextPart(each)) {
+      const Added added = add(each, use, level);
+      if (!added) return std::nullopt;
+      operands.push_back(*added);
+    }
+    return operands;
+  }
+
+  Added addFunction(BuiltIn function, const Operands& operands) {
+    const size_t count = operands.size();
+    if (count > XQueryMostScalarArguments) return {};
+    if (_into.scalars.operandCount() + count >= Terms::mostTerms) return {};
+    Terms::Term term;
+    term.kind = TermKind::BuiltIn;
+    term.code = static_cast<uint8_t>(function);
+    term.left = _into.scalars.addOperands(operands);
+    term.right = static_cast<Terms::Index>(count);
+    return _into.scalars.add(term);
+  }
+
+  // What is in parentheses or a variable, with predicates that ask for positions.
+  Added addPositions(XQueryPlaceID place, const XQueryPathExpr& path, int level) {
+    const XQueryStep* step = path.step();
+    if (!step || step->next() || step->kind() != Kind::FilterStep || !step->expr()) return {};
+    const XQueryPlaceID start = _program.part(place, XQueryRole::FirstStep);
+    if (start == XQueryNoPlace) return {};
+    Added items = add(start, Use::Answer, level);
+    size_t index = 0;
+    for (XQueryPlaceID each = _program.nextPart(start); items && each != XQueryNoPlace;
+         each = _program.nextPart(each), ++index) {
+      if (index >= step->predicates().size()) return {};
+      items = addPredicate(each, step->literalPosition(index), *items, level);
+    }
+    return items;
+  }
+
+  Added addPredicate(XQueryPlaceID place, const std::optional<uint64_t>& position,
+                     Terms::Index items, int level) {
+    if (position) {
+      if (*position > UINT32_MAX) return {};
+      const auto number = static_cast<int64_t>(*position);
+      return addFilter(BuiltIn::Item, items, addConstant(XQueryScalar::ofInteger(number)));
+    }
+    const XQueryPlaceID inside = XQueryPlaceInside(_program, place);
+    if (inside == XQueryNoPlace) return {};
+    const XQueryExpr& predicate = *_program[inside].expr;
+    if (const auto behind = XQueryItemsBehindAskedFor(predicate)) {
+      const auto number = static_cast<int64_t>(*behind);
+      return addFilter(BuiltIn::ItemFromBack, items, addConstant(XQueryScalar::ofInteger(number)));
+    }
+    const auto* comparison = dyn_cast<XQueryOperatorExpr>(&predicate);
+    const bool isOnLeft = comparison && XQueryIsPosition(comparison->left());
+    if (isOnLeft || (comparison && XQueryIsPosition(comparison->right()))) {
+      const int type = comparison->operatorType();
+      const auto kept = itemsKeptBy(isOnLeft ? type : XQueryMirroredComparison(type));
+      const XQueryPlaceID left = _program.firstPart(inside);
+      const XQueryPlaceID compared = isOnLeft ? _program.nextPart(left) : left;
+      return kept ? addFilter(*kept, items, add(compared, Use::Operand, level)) : Added();
+    }
+    return addFilter(BuiltIn::Item, items, add(inside, Use::Operand, level));
+  }
+
+  Added addFilter(BuiltIn function, Terms::Index items, const Added& asked) {
+    return asked ? addFunction(function, {items, *asked}) : Added();
   }
 
   Added addBuiltIn(const XQueryFunctionCall& call, XQueryPlaceID first, int level) {
@@ -201,7 +307,11 @@ class Compiler {
     }
     const bool isNot =
         call.function() == fn_not && hasArgument && _program.nextPart(first) == XQueryNoPlace;
-    if (!isNot) return {};
+    if (!isNot) {
+      const auto function = XQueryScalarFunctionOf(call);
+      const auto operands = function ? addOperands(first, Use::Answer, level) : std::nullopt;
+      return operands ? addFunction(*function, *operands) : Added();
+    }
     const Added negated = add(first, Use::Operand, level);
     if (!negated) return {};
     Terms::Term term;

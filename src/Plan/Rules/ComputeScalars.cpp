@@ -105,10 +105,14 @@ class Compiler {
     return _steps.add(step);
   }
 
-  // Of a declared function that takes machine numbers, with operands that may be some.
+  // Of a declared function that is computed so, with operands that may be what it takes. Where it
+  // is called by another one of these, that one has not been able to compute with what it was
+  // given.
   Added addCall(XQueryPlaceID place, int level) {
     const auto* call = dyn_cast<XQueryFunctionCall>(_program[place].expr);
     if (!call || call->builtIn() || !call->hasBody()) return std::nullopt;
+    const XQueryFunctionDecl* caller = _program.bodyOf(place).function;
+    if (caller && bodyOf(*caller)) return std::nullopt;
     const XQueryScalarBody* body = bodyOf(*call->functionDecl());
     if (!body) return std::nullopt;
     std::vector<Steps::Index> operands;
@@ -138,7 +142,8 @@ class Compiler {
   static bool fits(const XQueryFacts& facts, Use use) {
     constexpr auto numbers = XQueryItems::Integer | XQueryItems::Double;
     if (use == Use::Comparison) return facts.are(XQueryItems::Numeric) && facts.mayBe(numbers);
-    if (use == Use::ComparisonWithNumber || use == Use::Argument) return facts.mayBe(numbers);
+    if (use == Use::Argument) return true;
+    if (use == Use::ComparisonWithNumber) return facts.mayBe(numbers);
     return facts.mayBe(numbers | XQueryItems::Untyped | XQueryItems::Node);
   }
 

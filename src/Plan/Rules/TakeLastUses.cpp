@@ -18,6 +18,7 @@
 #include "Expr/XQueryLeaves.h"
 #include "Functions/XQueryFunctionCall.h"
 #include "Plan/Operators/XQueryLateElement.h"
+#include "Plan/Operators/XQueryScalarBody.h"
 #include "Plan/Operators/XQueryTakenVariable.h"
 #include "Plan/Planning.h"
 #include "Plan/Rules.h"
@@ -66,6 +67,15 @@ class Search {
     if (!call) return false;
     if (!call->builtIn()) return call->hasBody();
     return call->builtIn()->row().takingProc && _program.firstPart(here.parent) == place;
+  }
+
+  // Whether what was written is what is evaluated there. The body of a function that is computed
+  // without objects is, where that does not tell.
+  bool isAsWritten(XQueryPlaceID place) const {
+    if (_planning.isOpen(place)) return true;
+    const Ref<XQueryExpr> expr = _planning.exprAt(place);
+    const auto* planned = dyn_cast<XQueryPlannedExpr>(expr.get());
+    return planned && planned->scalarBody() && &planned->plain() == _program[place].expr;
   }
 
   bool isList(XQueryPlaceID place) const { return _program[place].expr->kind() == Kind::ExprList; }
@@ -169,27 +179,27 @@ class Search {
     const XQueryExpr& expr = *_program[whole].expr;
     switch (role) {
       case XQueryRole::Element:
-        return isList(whole) && _planning.isOpen(whole);
+        return isList(whole) && isAsWritten(whole);
       case XQueryRole::FirstStep:
         return keepsRange(whole);
       case XQueryRole::Argument:
         return expr.kind() == Kind::Args;
       case XQueryRole::Arguments:
       case XQueryRole::Branch:
-        return _planning.isOpen(whole);
+        return isAsWritten(whole);
       case XQueryRole::Operand: {
         const auto* operation = dyn_cast<XQueryOperatorExpr>(&expr);
-        return operation && isArithmetic(operation->operatorType()) && _planning.isOpen(whole);
+        return operation && isArithmetic(operation->operatorType()) && isAsWritten(whole);
       }
       case XQueryRole::Bound:
         return expr.kind() == Kind::LetExpr;
       case XQueryRole::Case:
         return expr.kind() == Kind::CaseClause;
       case XQueryRole::Clause:
-        if (expr.kind() == Kind::TypeswitchExpr) return _planning.isOpen(whole);
-        return isSingleTuple(expr) && _planning.isOpen(whole);
+        if (expr.kind() == Kind::TypeswitchExpr) return isAsWritten(whole);
+        return isSingleTuple(expr) && isAsWritten(whole);
       case XQueryRole::Return:
-        return isSingleTuple(expr) && _planning.isOpen(whole);
+        return isSingleTuple(expr) && isAsWritten(whole);
       default:
         return false;
     }
