@@ -17,6 +17,22 @@ BigInteger BigInteger::fromHalves(uint64_t high, uint64_t low) {
   return result;
 }
 
+BigInteger BigInteger::fromWide(Wide value) {
+  __extension__ using Magnitude = unsigned __int128;
+  const Magnitude magnitude = value < 0 ? -static_cast<Magnitude>(value) : Magnitude(value);
+  BigInteger result =
+      fromHalves(static_cast<uint64_t>(magnitude >> 64), static_cast<uint64_t>(magnitude));
+  if (value < 0) result.negate();
+  return result;
+}
+
+// Of a number of no limbs each is 0.
+BigInteger::Wide BigInteger::wide() const {
+  static_assert(GMP_NUMB_BITS == 64);
+  const Wide magnitude = Wide{mpz_getlimbn(_value, 1)} << 64 | Wide{mpz_getlimbn(_value, 0)};
+  return sign() < 0 ? -magnitude : magnitude;
+}
+
 BigInteger BigInteger::fromDigits(const std::string& digits) {
   BigInteger result;
   mpz_set_str(result._value, digits.c_str(), 10);

@@ -15,6 +15,8 @@ class BigInteger {
   BigInteger(int64_t value) { mpz_init_set_si(_value, value); }
   static BigInteger fromUnsigned(uint64_t value);
   static BigInteger fromHalves(uint64_t high, uint64_t low);
+  __extension__ using Wide = __int128;
+  static BigInteger fromWide(Wide value);
   // Decimal digits only.
   static BigInteger fromDigits(const std::string& digits);
   static BigInteger power(uint32_t base, uint32_t exponent);
@@ -44,6 +46,9 @@ class BigInteger {
   int64_t int64() const { return mpz_get_si(_value); }
   bool fitsUInt64() const { return mpz_fits_ulong_p(_value) != 0; }
   uint64_t uint64() const { return mpz_get_ui(_value); }
+  // Whether a Wide holds it; the magnitude has fewer than 128 bits.
+  bool fitsWide() const { return mpz_sizeinbase(_value, 2) < 128; }
+  Wide wide() const;
   // What holding the value takes.
   size_t bytes() const { return mpz_size(_value) * sizeof(mp_limb_t) + sizeof(*this); }
   // The number of decimal digits, or one more; fast.

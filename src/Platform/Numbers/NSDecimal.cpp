@@ -6,6 +6,8 @@
 #include "Platform/Numbers/NumberText.h"
 
 #include <algorithm>
+#include <array>
+#include <cstdlib>
 #include <memory>
 #include <stdexcept>
 #include <utility>
@@ -54,6 +56,66 @@ NSDecimal NSDecimalArithmetic::big(BigInteger coefficient, int64_t scale) {
   result._scale = static_cast<int32_t>(scale);
   result._state = NSDecimal::Big;
   return result;
+}
+
+namespace {
+
+using Wide = NSDecimalArithmetic::Wide;
+__extension__ using Magnitude = unsigned __int128;
+
+constexpr int32_t maximumWidePower = 38;
+
+constexpr auto widePowers = [] {
+  std::array<Wide, maximumWidePower + 1> powers = {1};
+  for (size_t exponent = 1; exponent < powers.size(); ++exponent) {
+    powers[exponent] = powers[exponent - 1] * 10;
+  }
+  return powers;
+}();
+
+// By halves, since two to the power of 64 leaves 6.
+bool endsWithZero(Wide value) {
+  if ((value & 1) != 0) return false;
+  const Magnitude magnitude = value < 0 ? -static_cast<Magnitude>(value) : Magnitude(value);
+  const auto high = static_cast<uint64_t>(magnitude >> 64);
+  return (high % 10 * 6 + static_cast<uint64_t>(magnitude) % 10) % 10 == 0;
+}
+
+}  // namespace
+
+NSDecimal NSDecimalArithmetic::wide(Wide coefficient, int32_t scale) {
+  for (; scale > 0 && endsWithZero(coefficient); --scale) {
+    if (coefficient == 0) return NSDecimal();
+    coefficient /= 10;
+  }
+  if (coefficient >= INT64_MIN && coefficient <= INT64_MAX) {
+    return small(static_cast<int64_t>(coefficient), scale);
+  }
+  NSDecimal result;
+  result._big = kept(BigInteger::fromWide(coefficient));
+  result._scale = scale;
+  result._state = NSDecimal::Big;
+  return result;
+}
+
+bool NSDecimalArithmetic::coefficientWide(const NSDecimal& value, Wide& coefficient) {
+  if (value._state == NSDecimal::Small) {
+    coefficient = value._coefficient;
+    return true;
+  }
+  if (value._state != NSDecimal::Big || !value._big->fitsWide()) return false;
+  coefficient = value._big->wide();
+  return true;
+}
+
+bool NSDecimalArithmetic::alignWide(const NSDecimal& a, const NSDecimal& b, Wide& alignedA,
+                                    Wide& alignedB) {
+  if (!coefficientWide(a, alignedA) || !coefficientWide(b, alignedB)) return false;
+  const int32_t difference = a._scale - b._scale;
+  if (difference > maximumWidePower || difference < -maximumWidePower) return false;
+  const Wide power = widePowers[static_cast<size_t>(std::abs(difference))];
+  Wide& toMove = difference > 0 ? alignedB : alignedA;
+  return !__builtin_mul_overflow(toMove, power, &toMove);
 }
 
 void NSDecimal::destroyBig() {
@@ -110,6 +172,12 @@ NSDecimal NSDecimal::add(const NSDecimal& other) const {
   if (Arithmetic::align(*this, other, a, b) && !__builtin_add_overflow(a, b, &a)) {
     return Arithmetic::small(a, std::max(_scale, other._scale));
   }
+  Wide wideA = 0;
+  Wide wideB = 0;
+  if (Arithmetic::alignWide(*this, other, wideA, wideB) &&
+      !__builtin_add_overflow(wideA, wideB, &wideA)) {
+    return Arithmetic::wide(wideA, std::max(_scale, other._scale));
+  }
   if (isNaN() || other.isNaN()) return notANumber();
   BigInteger bigA;
   BigInteger bigB;
@@ -123,6 +191,12 @@ NSDecimal NSDecimal::subtract(const NSDecimal& other) const {
   int64_t b = 0;
   if (Arithmetic::align(*this, other, a, b) && !__builtin_sub_overflow(a, b, &a)) {
     return Arithmetic::small(a, std::max(_scale, other._scale));
+  }
+  Wide wideA = 0;
+  Wide wideB = 0;
+  if (Arithmetic::alignWide(*this, other, wideA, wideB) &&
+      !__builtin_sub_overflow(wideA, wideB, &wideA)) {
+    return Arithmetic::wide(wideA, std::max(_scale, other._scale));
   }
   if (isNaN() || other.isNaN()) return notANumber();
   BigInteger bigA;
@@ -138,6 +212,12 @@ NSDecimal NSDecimal::multiply(const NSDecimal& other) const {
       !__builtin_mul_overflow(_coefficient, other._coefficient, &product) &&
       _scale + other._scale <= maximumDigits) {
     return Arithmetic::small(product, _scale + other._scale);
+  }
+  Wide wideA = 0;
+  Wide wideB = 0;
+  if (Arithmetic::coefficientWide(*this, wideA) && Arithmetic::coefficientWide(other, wideB) &&
+      !__builtin_mul_overflow(wideA, wideB, &wideA) && _scale + other._scale <= maximumDigits) {
+    return Arithmetic::wide(wideA, _scale + other._scale);
   }
   if (isNaN() || other.isNaN()) return notANumber();
   BigInteger result = Arithmetic::coefficient(*this);

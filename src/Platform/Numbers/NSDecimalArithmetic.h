@@ -1,7 +1,9 @@
 // What the files about decimals share: the operations that look inside one.
 //
 // Every operation has a fast path on 64-bit coefficients, taken as long as the overflow-checking
-// built-ins report none, and a general path on big integers. Both end in the same canonical form:
+// built-ins report none, and a general path on big integers. Sums, differences and products, and
+// what has been rounded to 38 digits, have one on 128 bits between. All end in the same canonical
+// form:
 // no trailing zeros after the point, a scale of at least 0, and a big coefficient only for what
 // 64 bits do not hold. So equality of values is equality of representations.
 #pragma once
@@ -42,6 +44,13 @@ class NSDecimalArithmetic {
     result._scale = scale;
     return result;
   }
+  using Wide = BigInteger::Wide;
+  // The scale is at least 0 and within bounds.
+  static NSDecimal wide(Wide coefficient, int32_t scale);
+  // Brings two decimals to one scale; false when 128 bits do not hold them.
+  static bool alignWide(const NSDecimal& a, const NSDecimal& b, Wide& alignedA, Wide& alignedB);
+  // Of a number; false when 128 bits do not hold it.
+  static bool coefficientWide(const NSDecimal& value, Wide& coefficient);
   // Throws std::length_error for more digits than a decimal holds.
   static NSDecimal big(BigInteger coefficient, int64_t scale);
 

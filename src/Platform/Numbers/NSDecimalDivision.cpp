@@ -78,10 +78,8 @@ NSDecimal NSDecimalArithmetic::roundedSmallQuotient(int64_t numerator, uint64_t 
     scale += static_cast<int32_t>(step);
   }
   if (remainder > denominator - remainder) ++digits;
-  BigInteger coefficient =
-      BigInteger::fromHalves(static_cast<uint64_t>(digits >> 64), static_cast<uint64_t>(digits));
-  if (numerator < 0) coefficient.negate();
-  return big(std::move(coefficient), scale);
+  const auto coefficient = static_cast<Wide>(digits);
+  return wide(numerator < 0 ? -coefficient : coefficient, scale);
 }
 
 // 38 significant digits of a quotient that does not end (or ends too late to be written out), with

@@ -1,5 +1,6 @@
 #include "Platform/Base/ProcessorTime.h"
 #include "Platform/Base/WorkMeter.h"
+#include "Platform/Numbers/BigInteger.h"
 #include "Platform/Numbers/DecimalTesting.h"
 #include "Platform/Numbers/NSDecimal.h"
 #include "Platform/Numbers/NumberText.h"
@@ -56,6 +57,70 @@ TEST(Decimal, SumDifferenceAndProductAgreeWithTheReference) {
               textOf(Int128{a.coefficient} * b.coefficient, a.scale + b.scale));
     ASSERT_EQ(x.compare(y), alignedA < alignedB ? -1 : alignedA > alignedB ? 1 : 0);
   }
+}
+
+// A number of up to so many digits, and what it is in digits and a scale.
+struct LongSample {
+  std::string digits;
+  int scale = 0;
+
+  explicit LongSample(std::mt19937_64& random) {
+    digits = randomDigits(random, random() % 44 + 1);
+    if (random() % 4 == 0) digits += std::string(random() % 20, '0');
+    if (random() % 2) digits.insert(digits.begin(), '-');
+    scale = static_cast<int>(random() % 42);
+  }
+  BigInteger coefficient(int atScale) const {
+    BigInteger result = BigInteger::fromDigits(digits);
+    result.multiplyByPowerOfTen(static_cast<uint32_t>(atScale - scale));
+    return result;
+  }
+  NSDecimal value() const { return decimal(digits + "e-" + std::to_string(scale)); }
+};
+
+std::string textOf(const BigInteger& coefficient, int scale) {
+  return decimal(coefficient.toString() + "e-" + std::to_string(scale)).toString();
+}
+
+// Around the bounds of 64 and of 128 bits.
+TEST(Decimal, LongSumsDifferencesAndProductsAgreeWithIntegers) {
+  std::mt19937_64 random(2);
+  for (int round = 0; round < 4000; ++round) {
+    const LongSample a(random);
+    const LongSample b(random);
+    const int scale = std::max(a.scale, b.scale);
+    BigInteger sum = a.coefficient(scale);
+    sum.add(b.coefficient(scale));
+    BigInteger difference = a.coefficient(scale);
+    difference.subtract(b.coefficient(scale));
+    BigInteger product = a.coefficient(a.scale);
+    product.multiply(b.coefficient(b.scale));
+    const NSDecimal x = a.value();
+    const NSDecimal y = b.value();
+    ASSERT_EQ(x.add(y).toString(), textOf(sum, scale));
+    ASSERT_EQ(x.subtract(y).toString(), textOf(difference, scale));
+    ASSERT_EQ(x.multiply(y).toString(), textOf(product, a.scale + b.scale));
+    // The canonical form is the same, whatever the way.
+    ASSERT_EQ(hashDigits(x.add(y)), hashDigits(decimal(textOf(sum, scale))));
+    ASSERT_EQ(x.add(y).compare(decimal(textOf(sum, scale))), 0);
+    ASSERT_EQ(x.subtract(x).toString(), "0");
+    ASSERT_EQ(x.add(y).subtract(y).toString(), x.toString());
+  }
+}
+
+TEST(Decimal, ExtremesOf128Bits) {
+  const NSDecimal greatest = decimal("170141183460469231731687303715884105727");
+  const NSDecimal one(1);
+  EXPECT_EQ(greatest.add(one).toString(), "170141183460469231731687303715884105728");
+  const NSDecimal least = greatest.negate().subtract(one);
+  EXPECT_EQ(least.toString(), "-170141183460469231731687303715884105728");
+  EXPECT_EQ(least.subtract(one).toString(), "-170141183460469231731687303715884105729");
+  EXPECT_EQ(least.add(greatest).toString(), "-1");
+  EXPECT_EQ(decimal("-85070591730234615865843651857942052864").multiply(NSDecimal(2)).toString(),
+            "-170141183460469231731687303715884105728");
+  EXPECT_EQ(
+      decimal("13611294676837538538534984297270728458.24").multiply(decimal("12.5")).toString(),
+      "170141183460469231731687303715884105728");
 }
 
 TEST(Decimal, ExtremesOf64Bits) {
