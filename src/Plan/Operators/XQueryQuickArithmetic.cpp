@@ -85,8 +85,16 @@ Value answerFor(int type, const NSObject* left, const NSObject* right) {
   const bool untypedOnes = type != XQueryOperatorIDiv;
   const auto a = XQueryNumericOperand::of(left, untypedOnes);
   if (a.form == XQueryNumericOperand::Other) return Value();
-  const auto b = XQueryNumericOperand::of(right, untypedOnes);
-  if (b.form == XQueryNumericOperand::Other) return Value();
+  return XQueryQuickArithmeticOf(type, a, XQueryNumericOperand::of(right, untypedOnes));
+}
+
+}  // namespace
+
+Value XQueryQuickArithmeticOf(int type, const XQueryNumericOperand& a,
+                              const XQueryNumericOperand& b) {
+  if (a.form == XQueryNumericOperand::Other || b.form == XQueryNumericOperand::Other) {
+    return Value();
+  }
   if (a.form == XQueryNumericOperand::Double || b.form == XQueryNumericOperand::Double) {
     return doubleAnswer(type, a.asDouble(), b.asDouble());
   }
@@ -97,8 +105,6 @@ Value answerFor(int type, const NSObject* left, const NSObject* right) {
   }
   return exactAnswer(type, *a.exact, *b.exact, bothIntegers);
 }
-
-}  // namespace
 
 Value XQueryQuickArithmetic(int type, const Value& left, const Value& right, XQueryContext&) {
   return answerFor(type, left.get(), right.get());

@@ -4,6 +4,7 @@
 #include "Expr/XQueryListChanges.h"
 #include "Expr/XQuerySequence.h"
 #include "Plan/Operators/XQueryMachineArithmetic.h"
+#include "Plan/Operators/XQueryQuickArithmetic.h"
 #include "Plan/Operators/XQueryScalarText.h"
 #include "Platform/Base/WorkMeter.h"
 #include "Types/XQueryNumericOperand.h"
@@ -11,6 +12,7 @@
 #include "xquery/Collection.h"
 
 #include <cmath>
+#include <stdexcept>
 #include <utility>
 #include <vector>
 
@@ -65,14 +67,59 @@ Scalar related(XQueryRelation relation, T a, T b) {
   return Scalar::ofTruth(relation.holds(a < b ? -1 : a > b ? 1 : 0));
 }
 
+// A number as it is; `integer` takes what is no object.
+XQueryNumericOperand operandOf(const Scalar& value, bool untypedOnes, NSDecimal& integer) {
+  XQueryNumericOperand operand;
+  if (value.form == Form::Object) return XQueryNumericOperand::of(value.object, untypedOnes);
+  if (value.form == Form::Double) {
+    operand.form = XQueryNumericOperand::Double;
+    operand.number = value.number;
+  } else if (value.form == Form::Integer) {
+    integer = NSDecimal(value.integer);
+    operand.form = XQueryNumericOperand::Exact;
+    operand.isInteger = true;
+    operand.exact = &integer;
+  }
+  return operand;
+}
+
+// Of decimals and large integers.
+Scalar longComparison(XQueryRelation relation, const Scalar& left, const Scalar& right) {
+  NSDecimal integers[2];
+  const auto a = operandOf(left, false, integers[0]);
+  const auto b = operandOf(right, false, integers[1]);
+  const bool areExact =
+      a.form == XQueryNumericOperand::Exact && b.form == XQueryNumericOperand::Exact;
+  return areExact ? Scalar::ofTruth(relation.holds(a.exact->compare(*b.exact))) : Scalar();
+}
+
 }  // namespace
+
+// More digits than a decimal holds are an error.
+XQueryScalar XQueryScalarLongArithmetic(int type, const Scalar& left, const Scalar& right,
+                                        XQueryScalarsMade& made) {
+  const bool untypedOnes = type != XQueryOperatorIDiv;
+  NSDecimal integers[2];
+  const auto a = operandOf(left, untypedOnes, integers[0]);
+  const auto b = operandOf(right, untypedOnes, integers[1]);
+  try {
+    Value result = XQueryQuickArithmeticOf(type, a, b);
+    const Scalar number = numberIn(Scalar::ofObject(result.get()), false);
+    return number.form != Form::Unknown || !result ? number
+                                                   : XQueryScalarMade(std::move(result), made);
+  } catch (const std::length_error&) {
+    return {};
+  }
+}
 
 // No relation holds for what is not a number.
 XQueryScalar XQueryScalarNumberComparison(int code, const Scalar& left, const Scalar& right) {
   const Scalar a = numberIn(left, false);
   const Scalar b = numberIn(right, false);
-  if (a.form == Form::Unknown || b.form == Form::Unknown) return {};
   const XQueryRelation relation = XQueryRelationForCode(code);
+  if (a.form == Form::Unknown || b.form == Form::Unknown) {
+    return longComparison(relation, left, right);
+  }
   if (a.form == Form::Integer && b.form == Form::Integer) {
     return related(relation, a.integer, b.integer);
   }

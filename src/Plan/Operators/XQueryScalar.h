@@ -4,7 +4,10 @@
 
 #include "xquery/Object.h"
 
+#include <cstddef>
 #include <cstdint>
+#include <utility>
+#include <vector>
 
 namespace xquery {
 
@@ -80,11 +83,24 @@ struct XQueryScalar {
 };
 static_assert(sizeof(XQueryScalar) == 16);
 
+// Objects that were made on the way and that values refer to.
+using XQueryScalarsMade = std::vector<Value>;
+// Adds one. Where there is one there are often more.
+inline XQueryScalar XQueryScalarMade(Value object, XQueryScalarsMade& made) {
+  constexpr size_t likely = 16;
+  if (made.capacity() == 0) made.reserve(likely);
+  made.push_back(std::move(object));
+  return XQueryScalar::ofObject(made.back().get());
+}
+
 // Each is what the operator answers; Unknown where an operand is something else than it knows, an
 // integer leaves its word, or there would be an error.
 
 // `type`: an operator of arithmetic.
 XQueryScalar XQueryScalarArithmetic(int type, const XQueryScalar& left, const XQueryScalar& right);
+// The same where numbers are objects, or become some: decimals and large integers.
+XQueryScalar XQueryScalarLongArithmetic(int type, const XQueryScalar& left,
+                                        const XQueryScalar& right, XQueryScalarsMade& made);
 // `code`: that of a value comparison. Of single items.
 XQueryScalar XQueryScalarComparison(int code, const XQueryScalar& left, const XQueryScalar& right);
 // The same of numbers alone.

@@ -59,8 +59,10 @@ XQueryScalar XQueryScalarSteps::valueOf(Index index, const XQueryContextInternal
       const Scalar left = operand(step.left, context, made);
       if (left.form == Form::Unknown) return left;
       const Scalar right = operand(step.right, context, made);
-      return step.kind == Kind::Arithmetic ? XQueryScalarArithmetic(step.code, left, right)
-                                           : XQueryScalarComparison(step.code, left, right);
+      if (step.kind == Kind::Comparison) return XQueryScalarComparison(step.code, left, right);
+      const Scalar result = XQueryScalarArithmetic(step.code, left, right);
+      return result.form == Form::Unknown ? XQueryScalarLongArithmetic(step.code, left, right, made)
+                                          : result;
     }
     case Kind::And:
     case Kind::Or:
@@ -86,7 +88,7 @@ XQueryScalar XQueryScalarSteps::called(const Step& step, const XQueryContextInte
   }
   Value own;
   const Scalar answer = step.body->answer(arguments.data(), own);
-  if (own) made.push_back(std::move(own));
+  if (own) XQueryScalarMade(std::move(own), made);
   return answer;
 }
 
@@ -107,7 +109,7 @@ XQueryScalar XQueryScalarSteps::logic(const Step& step, const XQueryContextInter
 Value XQueryScalarExpr::valueOf(const XQueryScalar& answer, XQueryContext& context) const {
   if (answer.form != Form::Object) return XQueryScalarValue(answer);
   const auto* callee = _steps.callee();
-  if (!callee) return {};
+  if (!callee) return XQueryScalarValue(answer);
   if (Value literal = callee->literalAnswered(answer, context)) return literal;
   return _steps.isConstant(answer.object) ? Value() : XQueryScalarValue(answer);
 }

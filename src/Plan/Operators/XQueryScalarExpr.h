@@ -3,10 +3,10 @@
 //
 //   $i * 7919 mod 10007 = 0 or position() = 1
 //
-// Each step knows the integers of a machine word, doubles and truth values, and equals there what
-// the operator answers; wherever an operand is something else, an integer leaves its word, or there
-// would be an error, the whole expression is evaluated as it was written. Nothing that has been
-// looked at until then can be told.
+// Each step knows numbers and truth values, and equals there what the operator answers; decimals
+// and integers that leave a word are objects. Wherever an operand is something else, or there would
+// be an error, the whole expression is evaluated as it was written. Nothing that has been looked at
+// until then can be told.
 #pragma once
 
 #include "Expr/Clauses/XQueryItemFold.h"
@@ -67,12 +67,10 @@ class XQueryScalarSteps {
   size_t count() const { return _steps.size(); }
   const Step& operator[](size_t index) const { return _steps[index]; }
 
-  // Objects that calls have answered, which values refer to.
-  using Made = std::vector<Value>;
+  using Made = XQueryScalarsMade;
 
-  // What the last step comes to. An object may be a variable's, of whatever shape, unless a call
-  // has answered it. `made` takes what the answer refers to, where that was made on the way. Throws
-  // where a call reaches a limit of the evaluation.
+  // What the last step comes to. `made` takes what the answer refers to, where that was made on the
+  // way. Throws where a call reaches a limit of the evaluation.
   XQueryScalar answer(const XQueryContext& context, Made& made) const;
   // Whether it is a literal that is passed to a function, which may answer it.
   bool isConstant(const NSObject* object) const;

@@ -200,8 +200,7 @@ Scalar concatenated(Arguments arguments, XQueryScalarsMade& made) {
       return {};
     }
   }
-  made.emplace_back(all.string());
-  return Scalar::ofObject(made.back().get());
+  return XQueryScalarMade(all.string(), made);
 }
 
 // --- numbers -------------------------------------------------------------------------------------

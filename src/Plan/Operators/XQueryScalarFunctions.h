@@ -11,7 +11,6 @@
 #include <cstdint>
 #include <optional>
 #include <span>
-#include <vector>
 
 namespace xquery {
 
@@ -43,9 +42,6 @@ enum class XQueryScalarFunction : uint8_t {
   ItemsBelow,
   ItemsUpTo,
 };
-
-// Objects that were made on the way and that values refer to.
-using XQueryScalarsMade = std::vector<Value>;
 
 // More arguments than this are left to the plain way.
 inline constexpr size_t XQueryMostScalarArguments = 12;

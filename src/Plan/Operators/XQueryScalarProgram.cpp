@@ -141,8 +141,11 @@ struct XQueryScalarProgram::Run {
         if (left.form == Form::Unknown) return left;
         const Scalar right = value(program._terms[term.right], slots);
         if (right.form == Form::Unknown) return right;
-        return term.kind == Kind::Arithmetic ? arithmetic(term.code, left, right)
-                                             : comparison(term.code, left, right);
+        if (term.kind == Kind::Comparison) return comparison(term.code, left, right);
+        const Scalar result = arithmetic(term.code, left, right);
+        return result.form == Form::Unknown
+                   ? XQueryScalarLongArithmetic(term.code, left, right, made)
+                   : result;
       }
       case Kind::General: {
         const Scalar left = value(program._terms[term.left], slots);

@@ -9,9 +9,9 @@
 // quantifiers over ranges, items of lists by their positions, calls of some built-in functions
 // (XQueryScalarFunctions.h) and of functions like it becomes a tree of terms. A call computes with
 // slots on the stack in place of a frame of variables, and neither arguments nor answers are made
-// objects. Wherever an operand is something else than these values, an integer leaves its word,
-// there would be an error or the stack ends, nothing is known, and the body is evaluated as it was
-// written: terms do nothing that could be told.
+// objects, but for decimals and integers beyond a word. Wherever an operand is something else than
+// these values, there would be an error or the stack ends, nothing is known, and the body is
+// evaluated as it was written: terms do nothing that could be told.
 //
 // What values refer to is held by the caller of the whole, or kept while the values may be used:
 // what a call has made goes with it, but for its answer.

@@ -1,7 +1,8 @@
 // Declared functions over numbers, texts and lists.
 //
-// Pattern     a function whose body consists of integer, double and string literals, true() and
-//             false(), its parameters, let variables without a type, arithmetic, comparisons,
+// Pattern     a function whose body consists of literals of numbers and strings, true() and
+// false(),
+//             its parameters, let variables without a type, arithmetic, comparisons,
 //             "and", "or", not(), conditionals, quantifiers over one range, items by position, as
 //             in $l[1] and $l[position() > $n], (), built-in functions of XQueryScalarFunctions.h
 //             and calls of functions for which the same holds
@@ -138,7 +139,9 @@ class Compiler {
     const auto number = XQueryNumericOperand::of(value, false);
     const bool isInteger = number.form == XQueryNumericOperand::Exact && number.isInteger &&
                            number.exact->isSmallInteger();
-    if (!isInteger && number.form != XQueryNumericOperand::Double) return {};
+    if (number.form == XQueryNumericOperand::Other) return {};
+    const bool isLong = !isInteger && number.form == XQueryNumericOperand::Exact;
+    if (isLong && use == Use::Operand) return addConstant(XQueryScalar::ofObject(value));
     if (use == Use::Answer) {
       _into.literals.emplace_back(&literal);
       return addConstant(XQueryScalar::ofObject(value));

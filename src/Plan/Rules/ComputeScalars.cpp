@@ -79,6 +79,8 @@ class Compiler {
     } else if (number.form == XQueryNumericOperand::Exact && number.isInteger &&
                number.exact->isSmallInteger()) {
       step.constant = XQueryScalar::ofInteger(number.exact->smallInteger());
+    } else if (number.form == XQueryNumericOperand::Exact) {
+      step.constant = XQueryScalar::ofObject(literal.literalValue().get());
     } else {
       return std::nullopt;
     }
@@ -140,7 +142,7 @@ class Compiler {
   }
 
   static bool fits(const XQueryFacts& facts, Use use) {
-    constexpr auto numbers = XQueryItems::Integer | XQueryItems::Double;
+    constexpr auto numbers = XQueryItems::AnyDecimal | XQueryItems::Double;
     if (use == Use::Comparison) return facts.are(XQueryItems::Numeric) && facts.mayBe(numbers);
     if (use == Use::Argument) return true;
     if (use == Use::ComparisonWithNumber) return facts.mayBe(numbers);
@@ -180,8 +182,6 @@ class Compiler {
     const int type = operation->operatorType();
     const auto code = static_cast<uint8_t>(type);
     if (second == XQueryNoPlace && !operation->isSign()) return std::nullopt;
-    // A quotient of integers is a decimal.
-    if (type == XQueryOperatorDiv && areExact(first) && areExact(second)) return std::nullopt;
     switch (XQueryOperatorExpr::operatorClassification(type)) {
       case logicalClass: {
         const auto kind = type == XQueryOperatorAnd ? StepKind::And : StepKind::Or;
@@ -201,10 +201,6 @@ class Compiler {
       default:
         return std::nullopt;
     }
-  }
-
-  bool areExact(XQueryPlaceID place) const {
-    return _planning.facts[place].are(XQueryItems::AnyDecimal);
   }
 
   // A sign adds to nothing, or takes from it.
