@@ -132,7 +132,8 @@ XQueryScalar XQueryScalarNumberComparison(int code, const Scalar& left, const Sc
 
 // Untyped texts and those of type xs:string are compared as strings, and so are all string types.
 XQueryScalar XQueryScalarComparison(int code, const Scalar& left, const Scalar& right) {
-  const bool isNumber = left.form == Form::Integer || left.form == Form::Double;
+  const bool isNumber = left.form == Form::Integer || left.form == Form::Double ||
+                        (left.form == Form::Object && isa<XQueryNumber>(left.object));
   if (isNumber) return XQueryScalarNumberComparison(code, left, right);
   const XQueryScalarText a(left);
   if (!a.isItem()) return XQueryScalarNumberComparison(code, left, right);
