@@ -56,6 +56,20 @@ class CountVisit {
   XQueryPathResults& _results;
 };
 
+// The same for all nodes of some kinds: what a document that was read is known to have.
+class CountKindsVisit : public CountVisit {
+ public:
+  using CountVisit::CountVisit;
+
+  bool visitIndexed(const NSXMLNode* first, const NSXMLNode* stop) const {
+    return add(NSXMLCountKinds(_test.kindsAlone(), first, stop));
+  }
+  bool visitIndexedAttributes(const NSXMLNode* first, const NSXMLNode* stop) const {
+    const bool areTaken = (_test.kindsAlone() & XQueryKindBit(Kind::Attribute)) != 0;
+    return areTaken && add(NSXMLCountAttributes(first, stop));
+  }
+};
+
 // The same for nodes of a name: those that the index has, without looking at them.
 class CountNamedVisit : public CountVisit {
  public:
@@ -392,6 +406,8 @@ void XQueryPathWalk::count(const XQueryWalkedStep& step, int axis, NSXMLNode* no
     XQueryWalkAnyAxis(node, axis, false, CountNamedVisit(test, results));
   } else if (test.onlyNames()) {
     XQueryWalkAnyAxis(node, axis, false, CountChoiceVisit(test, results));
+  } else if (test.kindsAlone()) {
+    XQueryWalkAnyAxis(node, axis, false, CountKindsVisit(test, results));
   } else {
     XQueryWalkAnyAxis(node, axis, false, CountVisit(test, results));
   }

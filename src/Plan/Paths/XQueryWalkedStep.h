@@ -128,6 +128,8 @@ class XQueryStepTest {
     return !_choice && _test.asksForKindAlone() && takesElements() &&
            (_test.kinds() & unnamed) == 0;
   }
+  // The kinds of which it takes every node, and no others, as bits; 0 where it asks for more.
+  uint32_t kindsAlone() const { return !_choice && _test.asksForKindAlone() ? _test.kinds() : 0; }
   bool takesElements() const { return (_test.kinds() & XQueryKindBit(Kind::Element)) != 0; }
   bool acceptsInstructions() const {
     return (_test.kinds() & XQueryKindBit(Kind::ProcessingInstruction)) != 0;

@@ -168,12 +168,12 @@ const NSXMLName* ReadNames::interned(std::string_view bytes, NSStringView URI) {
   return name;
 }
 
-const NSXMLName* ReadNames::elementName(ReadName& name) {
+ReadName::Interned& ReadNames::element(ReadName& name) {
   const ReadNamespace* const URI = name.prefix->bound;
-  if (name.element.name && name.element.URI == URI) [[likely]] {
-    return name.element.name;
+  if (!name.element.name || name.element.URI != URI) [[unlikely]] {
+    static_cast<void>(resolve(name, URI, name.element));
   }
-  return resolve(name, URI, name.element);
+  return name.element;
 }
 
 const NSXMLName* ReadNames::attributeName(ReadName& name) {

@@ -37,6 +37,7 @@ struct ReadName {
   struct Interned {
     const ReadNamespace* URI = nullptr;
     const NSXMLName* name = nullptr;
+    uint16_t number = 0;  // of an element: somebody's who builds the tree; 0 for none yet
   };
 
   uint64_t hash = 0;
@@ -96,7 +97,9 @@ class ReadNames {
         ((words[0] & name.masks[0]) ^ name.head[0]) | ((words[1] & name.masks[1]) ^ name.head[1]);
     return others == 0 && (name.bytes.size() <= sizeof words || isRest(name, place, textEnd));
   }
-  const NSXMLName* elementName(ReadName& name);
+  // Good until the next one is asked for.
+  ReadName::Interned& element(ReadName& name);
+  const NSXMLName* elementName(ReadName& name) { return element(name).name; }
   const NSXMLName* attributeName(ReadName& name);
   const NSXMLName* target(std::string_view bytes);  // of an instruction
 

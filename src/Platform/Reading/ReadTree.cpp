@@ -4,7 +4,6 @@
 #include "Platform/Reading/XMLCharacters.h"
 #include "Platform/Text/UTF8.h"
 #include "Platform/Tree/Names.h"
-#include "Platform/Tree/TreeIndexes.h"
 
 #include <algorithm>
 #include <cstring>
@@ -42,7 +41,8 @@ ReadTree::ReadTree(uint32_t options, size_t expectedBytes)
     : _alwaysKeepsWhitespace((options & NSXMLNodePreserveWhitespace) != 0),
       _keepsWhitespace(_alwaysKeepsWhitespace),
       _keepsCDATA((options & NSXMLNodePreserveCDATA) != 0),
-      _builder(std::max(expectedBytes, size_t{256}), std::max(expectedBytes / 2, size_t{128})) {
+      _builder(std::max(expectedBytes, size_t{256}), std::max(expectedBytes / 2, size_t{128})),
+      _log(std::make_unique<NSXMLElementLog>()) {
   _builder.tree().becomeOld();
   _builder.openDocument();
 }
@@ -50,7 +50,7 @@ ReadTree::ReadTree(uint32_t options, size_t expectedBytes)
 // What is known of the tree is put down while the builder still owns it: there may be no memory.
 NSXMLDocument* ReadTree::finish() {
   _builder.endOpenNodes();
-  NSXMLTreeIndexes::begin(_builder.current()->rootNode(), _singleNames.names());
+  NSXMLTreeIndexes::begin(_builder.current()->rootNode(), std::move(_log), _counts);
   return cast<NSXMLDocument>(_builder.finish());
 }
 
@@ -136,12 +136,14 @@ void ReadTree::checkWide(std::string_view text) {
 
 void ReadTree::dropOpenElement() {
   endSpaceChange();
+  _log->giveUp();
   _builder.dropOpenElement();
 }
 
 void ReadTree::backTo(const NSXMLTreeBuilder::Mark& mark) {
   _pending.clear();
   _pendingIsExact = false;
+  _log->giveUp();
   _builder.backTo(mark);
 }
 
@@ -194,13 +196,14 @@ void ReadTree::addSection(std::string_view text) {
 
 // --- markup ----------------------------------------------------------------------------------
 
-void ReadTree::openElement(const NSXMLName* name) {
+void ReadTree::openElement(const NSXMLName* name, NSXMLElementLog::Number& number) {
   flush();
-  _singleNames.add(name->expanded, *_builder.current());
-  _builder.openElement(name);
+  const NSXMLNode& parent = *_builder.current();
+  _log->open(_builder.openElement(name), name, number, parent);
 }
 
 void ReadTree::addNamespace(const NSXMLName* prefix, const NSStringView* storedURI) {
+  ++_counts.namespaces;
   if (storedURI) {
     _builder.addProperty(Kind::Namespace, prefix, storedURI);
   } else {
@@ -209,6 +212,7 @@ void ReadTree::addNamespace(const NSXMLName* prefix, const NSStringView* storedU
 }
 
 void ReadTree::addAttribute(const NSXMLName* name, const ReadText& value) {
+  ++_counts.attributes;
   withStorable(
       value, [&](auto storable) { return _builder.addProperty(Kind::Attribute, name, storable); });
   if (name->prefixLength) hearSpace(name, value.bytes);
@@ -233,16 +237,20 @@ void ReadTree::endSpaceChange() {
 void ReadTree::closeElement() {
   flush();
   endSpaceChange();
+  _log->close();
   _builder.close();
 }
 
 void ReadTree::addComment(const ReadText& text) {
   flush();
+  ++_counts.comments;
   addLeaf(Kind::Comment, text);
 }
 
 void ReadTree::addInstruction(const NSXMLName* target, const ReadText& text) {
   flush();
+  _log->addInstruction();
+  ++_counts.instructions;
   withStorable(text, [&](auto storable) { return _builder.addInstruction(target, storable); });
 }
 

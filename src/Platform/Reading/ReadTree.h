@@ -8,9 +8,11 @@
 #pragma once
 
 #include "Platform/Text/Blocks.h"
-#include "Platform/Tree/SingleNames.h"
+#include "Platform/Tree/ElementLog.h"
 #include "Platform/Tree/TreeBuilder.h"
+#include "Platform/Tree/TreeIndexes.h"
 
+#include <memory>
 #include <string_view>
 #include <vector>
 
@@ -37,7 +39,12 @@ class ReadTree {
 
   // Names must have been adopted by the tree. Of an element, its namespaces and then its attributes
   // follow.
-  void openElement(const NSXMLName* name);
+  void openElement(const NSXMLName* name) {
+    NSXMLElementLog::Number unknown = 0;
+    openElement(name, unknown);
+  }
+  // The number is kept for the name, and is 0 before the first time.
+  void openElement(const NSXMLName* name, NSXMLElementLog::Number& number);
   void addNamespace(const NSXMLName* prefix, const NSStringView* storedURI);  // null for no URI
   void addAttribute(const NSXMLName* name, const ReadText& value);
   void closeElement();
@@ -96,7 +103,8 @@ class ReadTree {
   bool _keepsCDATA;
   bool _pendingIsExact = false;  // some of it came from a CDATA section: kept whatever it is
   NSXMLTreeBuilder _builder;
-  NSXMLSingleNamesMaker _singleNames;
+  std::unique_ptr<NSXMLElementLog> _log;
+  NSXMLKindCounts _counts;  // but elements and texts
   std::vector<SpaceChange, ValueAllocator<SpaceChange>> _spaceChanges;
   ValueText<char> _pending;  // text not yet stored
   std::vector<char16_t, ValueAllocator<char16_t>> _units;

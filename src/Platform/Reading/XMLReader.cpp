@@ -358,7 +358,8 @@ void XMLReader::openElement(ReadName& name) {
   _open.push_back(&name);
   _hasRoot = true;
   if (_projected) return _projected->open(name, _tag);
-  _tree.openElement(_names.elementName(name));
+  ReadName::Interned& interned = _names.element(name);
+  _tree.openElement(interned.name, interned.number);
   if (_tag.declares) _tag.addNamespaces(_tree, _names);
   if (!_tag.attributes.empty()) addAttributes();
 }

@@ -127,6 +127,15 @@ class NSXMLNodeList {
     _start = arrived._start;
     for (size_t i = 0; i < arrived.size(); ++i) _places[placeOf(i)] = arrived._places[i];
   }
+  // So many nodes of the range that the node is in: fill(put) calls put(i, node) once for each
+  // place.
+  template <class Fill>
+  void arrange(const NSXMLNode* node, size_t count, Fill fill) {
+    _places.resize(count);
+    _start = NSXMLNodePlace::start(node);
+    NSXMLNodePlace* const places = _places.data();
+    fill([places](size_t i, const NSXMLNode* each) { places[i] = NSXMLNodePlace(each); });
+  }
   template <class Takes>
   void keepThose(Takes takes) {
     std::erase_if(_places, [&](NSXMLNodePlace place) { return !takes(*place.node(_start)); });

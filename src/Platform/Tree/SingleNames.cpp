@@ -1,30 +1,25 @@
 #include "Platform/Tree/SingleNames.h"
 
+#include <bit>
+
 namespace xquery {
 
-void NSXMLSingleNamesMaker::addName(size_t place, const NSXMLExpandedName* name, uint32_t parent) {
-  if (_count == mostNames) return;
-  _table[place] = {name, parent, true};
-  ++_count;
-  if (2 * _count <= _table.size()) return;
-  NSXMLIndexList<Name> old(2 * _table.size());
-  old.swap(_table);
-  for (const Name& each : old) {
-    if (!each.name) continue;
-    size_t free = NSXMLSingleNames::placeOf(each.name) & (_table.size() - 1);
-    while (_table[free].name) free = (free + 1) & (_table.size() - 1);
-    _table[free] = each;
+std::unique_ptr<const NSXMLSingleNames> NSXMLSingleNames::ofThose(const Candidates& candidates) {
+  const size_t size = std::bit_ceil(2 * candidates.size() + 1);
+  Candidates seen(size);
+  for (const Candidate& each : candidates) {
+    size_t place = placeOf(each.name) & (size - 1);
+    while (seen[place].name && seen[place].name != each.name) place = (place + 1) & (size - 1);
+    const bool isFirst = !seen[place].name;
+    seen[place] = {each.name, isFirst && each.isSingle};
   }
-}
-
-std::unique_ptr<const NSXMLSingleNames> NSXMLSingleNamesMaker::names() const {
-  std::unique_ptr<NSXMLSingleNames> made(new NSXMLSingleNames(_table.size()));
+  std::unique_ptr<NSXMLSingleNames> made(new NSXMLSingleNames(size));
   bool areAny = false;
-  for (const Name& each : _table) {
-    if (!each.name || !each.isSingle) continue;
+  for (const Candidate& each : seen) {
+    if (!each.isSingle) continue;
     areAny = true;
-    size_t free = NSXMLSingleNames::placeOf(each.name) & (_table.size() - 1);
-    while (made->_table[free]) free = (free + 1) & (_table.size() - 1);
+    size_t free = placeOf(each.name) & (size - 1);
+    while (made->_table[free]) free = (free + 1) & (size - 1);
     made->_table[free] = each.name;
   }
   return areAny ? std::move(made) : nullptr;

@@ -10,11 +10,10 @@
 //   <a>1 <a>2 <b>3/> </a> <b>4/> </a>        parents 2 and 1: taken for one that is not single
 //
 // As long as the parents of a name come in ascending order, each is another one. So nothing has to
-// be remembered for an element, and what is said to be single always is.
+// be remembered for an element, and what is said to be single always is (ElementLog.h looks).
 #pragma once
 
 #include "Platform/Tree/NodeSpan.h"
-#include "Platform/Tree/TreeHead.h"
 #include "xquery/XMLNode.h"
 
 #include <cstddef>
@@ -23,9 +22,21 @@
 
 namespace xquery {
 
+// So are two ways to write one name taken for one that is not single.
+//
 // Never changes. Of the tree as it was: whoever asks sees to it that it has not changed.
 class NSXMLSingleNames {
  public:
+  // A name as it is written in one way, and whether it is single as far as that goes.
+  struct Candidate {
+    const NSXMLExpandedName* name = nullptr;
+    bool isSingle = false;
+  };
+  using Candidates = NSXMLIndexList<Candidate>;
+  // Null for none.
+  [[nodiscard]] static std::unique_ptr<const NSXMLSingleNames> ofThose(
+      const Candidates& candidates);
+
   bool contains(const NSXMLExpandedName* name) const {
     size_t place = placeOf(name) & (_table.size() - 1);
     while (_table[place] && _table[place] != name) place = (place + 1) & (_table.size() - 1);
@@ -33,7 +44,6 @@ class NSXMLSingleNames {
   }
 
  private:
-  friend class NSXMLSingleNamesMaker;
   explicit NSXMLSingleNames(size_t size) : _table(size) {}
   static size_t placeOf(const NSXMLExpandedName* name) {
     constexpr uint64_t mix = 0x9E3779B97F4A7C15;
@@ -42,41 +52,6 @@ class NSXMLSingleNames {
 
   // 2^n places, at most half of them taken. The tree holds the names.
   NSXMLIndexList<const NSXMLExpandedName*> _table;
-};
-
-// Told of the elements of a tree while it is built.
-class NSXMLSingleNamesMaker {
- public:
-  // Documents have few names, and in those that have more the first ones are told apart.
-  static constexpr size_t mostNames = 256;
-
-  // An element of the name begins below the parent, whose number is good.
-  void add(const NSXMLExpandedName* name, const NSXMLNode& parent) {
-    const uint32_t number = NSXMLNodeOrder::number(parent);
-    size_t place = NSXMLSingleNames::placeOf(name) & (_table.size() - 1);
-    while (_table[place].name != name) {
-      if (!_table[place].name) return addName(place, name, number);
-      place = (place + 1) & (_table.size() - 1);
-    }
-    Name& known = _table[place];
-    if (number <= known.lastParent) known.isSingle = false;
-    known.lastParent = number;
-  }
-  // Null for none.
-  [[nodiscard]] std::unique_ptr<const NSXMLSingleNames> names() const;
-
- private:
-  struct Name {
-    const NSXMLExpandedName* name = nullptr;
-    uint32_t lastParent = 0;
-    bool isSingle = true;
-  };
-  static constexpr size_t smallestTable = 32;
-
-  void addName(size_t place, const NSXMLExpandedName* name, uint32_t parent);
-
-  NSXMLIndexList<Name> _table{smallestTable};
-  size_t _count = 0;
 };
 
 }  // namespace xquery

@@ -4,6 +4,7 @@
 #include "Platform/Base/WorkMeter.h"
 #include "Platform/Tree/TreeHead.h"
 
+#include <algorithm>
 #include <new>
 
 namespace xquery {
@@ -77,13 +78,23 @@ NSXMLIndexesRef NSXMLTreeIndexes::of(const NSXMLNode* node) {
   return NSXMLIndexesRef(present);
 }
 
-void NSXMLTreeIndexes::begin(const NSXMLNode* root,
-                             std::unique_ptr<const NSXMLSingleNames> singleNames) {
-  if (!singleNames) return;
+void NSXMLTreeIndexes::begin(const NSXMLNode* root, std::unique_ptr<const NSXMLElementLog> log,
+                             const NSXMLKindCounts& counts) {
+  const uint32_t lastNumber = numberOfLast(root);
+  if (lastNumber < fewNodes) return;
+  NSXMLKindCounts all = counts;
+  all.elements = log->count();
+  // Numbers are given to all, from that of the document on.
+  all.texts = lastNumber - NSXMLTree::firstOrderNumber - all.elements - all.attributes -
+              all.namespaces - all.comments - all.instructions;
+  std::unique_ptr<const NSXMLSingleNames> singleNames = log->singleNames();
+  if (!log->isComplete()) log = nullptr;
   const LastingObjects lasting;
   NSXMLTreeIndexes* const made = make(root);
-  if (!made) return;
+  made->_counts = all;
   made->_singleNames = std::move(singleNames);
+  made->_isLogged = log != nullptr;
+  made->_log = std::move(log);
   NSXMLTree* const tree = NSXMLTree::of(root);
   tree->dropIndexes();
   tree->_indexes.store(made, std::memory_order_release);
@@ -120,14 +131,40 @@ const Index* NSXMLTreeIndexes::makeOnce(Place<Index>& place, size_t bytes, Make 
 }
 
 const NSXMLNameIndex* NSXMLTreeIndexes::makeElements() {
-  return makeOnce(_elements, NSXMLNameIndex::mostBytes(_lastNumber),
-                  [this] { return NSXMLNameIndex::ofElements(_root, _lastNumber); });
+  return makeOnce(_elements, NSXMLNameIndex::mostBytes(_lastNumber), [this] {
+    return _log ? NSXMLNameIndex::ofElements(*_log, _root)
+                : NSXMLNameIndex::ofElements(_root, _lastNumber);
+  });
 }
 
 const NSXMLNameIndex* NSXMLTreeIndexes::elements(uint64_t work) {
   const NSXMLNameIndex* const present = _elements.index.load(std::memory_order_acquire);
-  if (present || !isWorth(_elements.workDone, work)) return present;
-  return makeElements();
+  if (present && !_isLogged) return present;
+  const bool isDue = isWorth(_elements.workDone, work);
+  if (present) return present;
+  constexpr uint64_t quicker = 4;
+  const uint64_t asked = _elements.workDone.load(std::memory_order_relaxed);
+  return isDue || (_isLogged && asked >= _lastNumber / 2 / quicker) ? makeElements() : nullptr;
+}
+
+const NSXMLNameIndex* NSXMLTreeIndexes::elementsWithWays() {
+  const NSXMLNameIndex* const present = _elements.index.load(std::memory_order_acquire);
+  if (present && !present->asksForWays()) return present;
+  if (!isWorth(_elements.workDone, 0)) return nullptr;
+  const NSXMLNameIndex* const elements = present ? present : makeElements();
+  return elements && elements->asksForWays() ? addWays(*elements) : elements;
+}
+
+// Null when another thread makes something, or when they might take too much.
+const NSXMLNameIndex* NSXMLTreeIndexes::addWays(const NSXMLNameIndex& elements) {
+  constexpr size_t bytesPerWay = 256;  // while they are found
+  const size_t mostWays = std::min<size_t>(_lastNumber, NSXMLNameIndex::mostWays);
+  if (!hasRoomFor(mostWays * bytesPerWay)) return nullptr;
+  const std::unique_lock<std::mutex> guard(_making, std::try_to_lock);
+  if (!guard) return nullptr;
+  if (elements.asksForWays()) elements.addWays(*_log);
+  _log = nullptr;
+  return &elements;
 }
 
 const NSXMLNameIndex* NSXMLTreeIndexes::attributes(uint64_t work) {
@@ -249,9 +286,62 @@ std::optional<uint64_t> NSXMLCountIndexedElements(const NSXMLNameSelection& name
   return elements ? std::optional(elements->count(names, first, stop)) : std::nullopt;
 }
 
+uint64_t NSXMLKindCounts::of(Kind kind) const {
+  switch (kind) {
+    case Kind::Element:
+      return elements;
+    case Kind::Text:
+      return texts;
+    case Kind::Comment:
+      return comments;
+    case Kind::ProcessingInstruction:
+      return instructions;
+    default:
+      return 0;
+  }
+}
+
+namespace {
+
+// Whether such a walk meets all descendants of a document.
+bool isWholeDocument(const NSXMLNode* first, const NSXMLNode* stop) {
+  const NSXMLNode* const above = stop ? nullptr : first->parent();
+  return above && above->kind() == Kind::Document && above->firstChild() == first;
+}
+
+// What `count` makes of the counts, if they are known.
+template <class Count>
+std::optional<uint64_t> countWith(const NSXMLNode* first, const NSXMLNode* stop, Count count) {
+  if (!isWholeDocument(first, stop)) return std::nullopt;
+  const NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(first);
+  const NSXMLKindCounts* const counts = indexes ? indexes->counts() : nullptr;
+  return counts ? std::optional<uint64_t>(count(*counts)) : std::nullopt;
+}
+
+}  // namespace
+
+std::optional<uint64_t> NSXMLCountKinds(uint32_t kinds, const NSXMLNode* first,
+                                        const NSXMLNode* stop) {
+  return countWith(first, stop, [kinds](const NSXMLKindCounts& counts) {
+    uint64_t count = 0;
+    for (const Kind each :
+         {Kind::Element, Kind::Text, Kind::Comment, Kind::ProcessingInstruction}) {
+      if (kinds & 1U << static_cast<unsigned>(each)) count += counts.of(each);
+    }
+    return count;
+  });
+}
+
+// The walk may begin with the document itself, which has none.
+std::optional<uint64_t> NSXMLCountAttributes(const NSXMLNode* first, const NSXMLNode* stop) {
+  if (first->kind() == Kind::Document) first = first->firstChild();
+  if (!first) return std::nullopt;
+  return countWith(first, stop, [](const NSXMLKindCounts& counts) { return counts.attributes; });
+}
+
 NSXMLIndexedWays NSXMLIndexedWays::of(const NSXMLNode* document) {
   NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(document);
-  const NSXMLNameIndex* const elements = indexes ? indexes->elements(0) : nullptr;
+  const NSXMLNameIndex* const elements = indexes ? indexes->elementsWithWays() : nullptr;
   return {std::move(indexes), elements};
 }
 

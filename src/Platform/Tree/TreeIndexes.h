@@ -9,6 +9,10 @@
 //             would have saved is added up, and when it comes to half a walk through the tree,
 //             whoever asks next makes the index: a document that is asked once is walked once, and
 //             asking never costs much more than twice what it would with what comes later known.
+//   on record The elements of a tree that was read are on record (ElementLog.h), from which their
+//             index is made in a fifth of the time of a walk: so it is made when an eighth of one
+//             is asked for. The ways, which only some ask for, are added when the rest has come
+//             together, and then the record goes.
 //   who       One thread makes it; others walk meanwhile, so that nobody waits. An index that is
 //             made is published by one pointer and never changes.
 //   limits    Making one looks at deadline and flag, and what it takes counts towards the ceiling
@@ -22,6 +26,7 @@
 #pragma once
 
 #include "Platform/Tree/Arena.h"
+#include "Platform/Tree/ElementLog.h"
 #include "Platform/Tree/NameIndex.h"
 #include "Platform/Tree/SingleNames.h"
 #include "Platform/Tree/ValueIndex.h"
@@ -37,6 +42,18 @@
 namespace xquery {
 
 class NSXMLTreeIndexes;
+
+// How many nodes of each kind a document has; a document that is read is counted meanwhile.
+struct NSXMLKindCounts {
+  uint64_t attributes = 0;
+  uint64_t namespaces = 0;
+  uint64_t comments = 0;
+  uint64_t instructions = 0;
+  uint64_t elements = 0;
+  uint64_t texts = 0;
+
+  uint64_t of(Kind kind) const;
+};
 
 // A count of the indexes of a tree, or null. The nodes in them live as long as their tree.
 class NSXMLIndexesRef {
@@ -70,9 +87,12 @@ class NSXMLTreeIndexes {
   // Whether they are those of the node's tree as it is now.
   bool isOf(const NSXMLNode* node) const;
 
-  // For who has built a tree that nobody else knows yet: what has been found out about it, kept
-  // until it changes. Not for small trees.
-  static void begin(const NSXMLNode* root, std::unique_ptr<const NSXMLSingleNames> singleNames);
+  // For who has built a document that nobody else knows yet: what has been put down about it, kept
+  // until it changes. Elements and texts are counted here. Not for small trees.
+  static void begin(const NSXMLNode* document, std::unique_ptr<const NSXMLElementLog> log,
+                    const NSXMLKindCounts& counts);
+  // Of the whole document; null for not known.
+  const NSXMLKindCounts* counts() const { return _counts ? &*_counts : nullptr; }
   // Whether it is known that no sibling of an element has the same name.
   static bool isSingle(const NSXMLNode* element) {
     const NSXMLTreeIndexes* const known =
@@ -95,6 +115,8 @@ class NSXMLTreeIndexes {
   // how many nodes that walk will meet.
   const NSXMLNameIndex* elements(uint64_t work);
   const NSXMLNameIndex* attributes(uint64_t work);
+  // Elements, if their ways are known as well or are worth finding out now.
+  const NSXMLNameIndex* elementsWithWays();
   // For walks that are known when they are done.
   void addWork(uint64_t work) { _elements.workDone.fetch_add(work, std::memory_order_relaxed); }
   // `work` includes the way from each element to its values.
@@ -135,6 +157,7 @@ class NSXMLTreeIndexes {
   template <class Index, class Make>
   const Index* makeOnce(Place<Index>& place, size_t bytes, Make make);
   const NSXMLNameIndex* makeElements();
+  const NSXMLNameIndex* addWays(const NSXMLNameIndex& elements);
   const NSXMLValueIndex* makeOfOwners(KeyPlace& place, const NSXMLNameIndex& names);
   KeyPlace* placeOf(const NSXMLValueKey& key);
 
@@ -143,6 +166,10 @@ class NSXMLTreeIndexes {
   const NSXMLNode* const _root;
   const uint32_t _lastNumber;
   std::mutex _making;
+  // While it is of use; only for who makes something. Whether there was one never changes.
+  std::unique_ptr<const NSXMLElementLog> _log;
+  bool _isLogged = false;
+  std::optional<NSXMLKindCounts> _counts;                // known from the beginning, or none
   std::unique_ptr<const NSXMLSingleNames> _singleNames;  // known from the beginning, or null
   Place<NSXMLNameIndex> _elements;
   Place<NSXMLNameIndex> _attributes;
@@ -172,6 +199,12 @@ struct NSXMLIndexedNodes {
                                                                 bool withInstructions,
                                                                 const NSXMLNode* first,
                                                                 const NSXMLNode* stop);
+// How many nodes of some kinds, which are given as a bit for each, a walk of that sort through a
+// whole document meets, and how many attributes its elements have; none for: walk.
+[[nodiscard]] std::optional<uint64_t> NSXMLCountKinds(uint32_t kinds, const NSXMLNode* first,
+                                                      const NSXMLNode* stop);
+[[nodiscard]] std::optional<uint64_t> NSXMLCountAttributes(const NSXMLNode* first,
+                                                           const NSXMLNode* stop);
 // What is known of the elements below a document, which is the root of its tree; null for: walk.
 struct NSXMLIndexedWays {
   NSXMLIndexesRef indexes;

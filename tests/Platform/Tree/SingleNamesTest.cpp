@@ -119,7 +119,7 @@ TEST(XMLSingleNames, AreKnownWhoeverReadsTheDocument) {
 
 TEST(XMLSingleNames, AreAsManyAsAreToldApart) {
   std::string content;
-  const size_t most = NSXMLSingleNamesMaker::mostNames;
+  const size_t most = NSXMLElementLog::mostNames;
   for (size_t i = 0; i < most + 50; ++i) {
     content += "<e><n" + std::to_string(i) + "/></e>";
   }

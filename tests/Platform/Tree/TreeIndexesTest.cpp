@@ -364,9 +364,16 @@ std::optional<Nodes> indexed(const NSXMLExpandedName* wanted, const NSXMLNode* f
   return listed(found->nodes);
 }
 
-TEST(XMLTreeIndexes, AreMadeWhenATreeIsAskedASecondTime) {
+TEST(XMLTreeIndexes, AreMadeAtOnceOfWhatIsOnRecord) {
   const auto document = parsed(Records(1).text(500));
   NSXMLNode* root = document->rootElement();
+  EXPECT_EQ(indexed(name("a").get(), root), walked(Kind::Element, name("a").get(), root, nullptr));
+  EXPECT_EQ(indexed(name("none").get(), root), Nodes());
+}
+
+TEST(XMLTreeIndexes, AreMadeWhenATreeIsAskedASecondTime) {
+  const Ref<NSXMLNode> document = parsed(Records(1).text(500))->copy();
+  NSXMLNode* root = document->firstChild();
   EXPECT_FALSE(indexed(name("a").get(), root));
   EXPECT_EQ(indexed(name("a").get(), root), walked(Kind::Element, name("a").get(), root, nullptr));
   EXPECT_EQ(indexed(name("none").get(), root), Nodes());
@@ -380,15 +387,24 @@ TEST(XMLTreeIndexes, AreMadeForPartsWhenTheseComeToHalfTheTree) {
     text += "</p>";
   }
   const auto document = parsed(text + "</r>");
-  int turn = 0;
-  for (NSXMLNode* part = document->rootElement()->firstChild(); part->nextSibling();
-       part = part->nextSibling(), ++turn) {
-    const auto found = indexed(name("e").get(), part->firstChild(), part->nextSibling());
-    EXPECT_EQ(found.has_value(), turn >= 6) << turn;
-    if (found) {
-      EXPECT_EQ(found->size(), 300u);
+  const auto copy = document->copy();
+  const auto partsWalked = [](const NSXMLNode* root) {
+    int turn = 0;
+    int count = 0;
+    for (NSXMLNode* part = root->firstChild()->firstChild(); part->nextSibling();
+         part = part->nextSibling(), ++turn) {
+      const auto found = indexed(name("e").get(), part->firstChild(), part->nextSibling());
+      if (!found) {
+        EXPECT_EQ(count++, turn);
+      } else {
+        EXPECT_EQ(found->size(), 300u);
+      }
     }
-  }
+    return count;
+  };
+  EXPECT_EQ(partsWalked(copy.get()), 6);
+  // To an eighth, where elements are on record.
+  EXPECT_EQ(partsWalked(document.get()), 1);
 }
 
 TEST(XMLTreeIndexes, AreNotForSmallTreesAndSmallParts) {
@@ -529,10 +545,67 @@ TEST(XMLTreeIndexes, NodesThatSomebodyHoldsStayWhatTheyWereAtAChange) {
   EXPECT_EQ(listed(held->nodes), before);
 }
 
+// --- kinds -------------------------------------------------------------------------------------
+
+size_t kindsWalked(const NSXMLNode* document, uint32_t kinds) {
+  size_t count = 0;
+  for (const NSXMLNode* node = document->firstChild(); node; node = node->nextNode()) {
+    count += kinds >> static_cast<unsigned>(node->kind()) & 1;
+  }
+  return count;
+}
+
+size_t attributesWalked(const NSXMLNode* document) {
+  size_t count = 0;
+  for (const NSXMLNode* node = document->firstChild(); node; node = node->nextNode()) {
+    if (const auto* element = dyn_cast<NSXMLElement>(node)) count += element->attributeCount();
+  }
+  return count;
+}
+
+// By whichever reader, with whatever is left out.
+TEST(XMLKindCounts, AreWhatAWalkFinds) {
+  const std::string prologs[] = {
+      "<!--1--><?a b?>", "<!DOCTYPE r [<!ENTITY e '<a x=\"1\"/>t'><!ATTLIST a y CDATA '2'>]>"};
+  for (uint32_t seed = 0; seed < 20; ++seed) {
+    const std::string inner = "<a xmlns='urn:d' xmlns:q='urn:q'><![CDATA[<]]>&lt;<?p?></a> ";
+    const std::string text = prologs[seed % 2] + "<w>" + inner + Records(seed).text(400) + inner +
+                             (seed % 2 ? "&e;" : " ") + "</w><!--2-->";
+    for (const uint32_t options :
+         {uint32_t{NSXMLNodeOptionsNone}, uint32_t{NSXMLNodePreserveWhitespace},
+          NSXMLNodePreserveCDATA | NSXMLNodePreserveWhitespace}) {
+      const auto document = NSXMLDocument::documentWithData(text, options);
+      ASSERT_TRUE(document);
+      const NSXMLNode* const first = document->firstChild();
+      for (uint32_t kinds = 0; kinds < 256; kinds += 4) {
+        ASSERT_EQ(NSXMLCountKinds(kinds, first, nullptr), kindsWalked(document.get(), kinds));
+      }
+      ASSERT_EQ(NSXMLCountAttributes(first, nullptr), attributesWalked(document.get()));
+      ASSERT_EQ(NSXMLCountAttributes(document.get(), nullptr), attributesWalked(document.get()));
+    }
+  }
+}
+
+TEST(XMLKindCounts, AreOfWholeDocumentsThatHaveNotChanged) {
+  constexpr uint32_t all = 255;
+  const auto document = parsed(Records(3).text(500));
+  const NSXMLNode* const root = document->rootElement();
+  EXPECT_TRUE(NSXMLCountKinds(all, root, nullptr));
+  EXPECT_FALSE(NSXMLCountKinds(all, root->firstChild(), nullptr));
+  EXPECT_FALSE(NSXMLCountKinds(all, root, root->lastChild()));
+  EXPECT_FALSE(NSXMLCountKinds(all, document.get(), nullptr));
+  EXPECT_FALSE(NSXMLCountKinds(all, parsed("<r/>")->rootElement(), nullptr));
+  const auto copy = document->copy();
+  EXPECT_FALSE(NSXMLCountKinds(all, copy->firstChild(), nullptr));
+  document->rootElement()->addChild(NSXMLNode::commentWithStringValue(A("c")));
+  EXPECT_FALSE(NSXMLCountKinds(all, root, nullptr));
+  EXPECT_FALSE(NSXMLCountAttributes(root, nullptr));
+}
+
 // --- limits --------------------------------------------------------------------------------------
 
 TEST(XMLTreeIndexes, OneThatIsEndedLeavesNothingBehind) {
-  const auto document = parsed(Records(9).text(4000));
+  const Ref<NSXMLNode> document = parsed(Records(9).text(4000))->copy();
   const NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(document.get());
   const NSXMLValueKey key{name("a"), {}, {}};
   // The one empty text of the process, the value of elements without any, counts for its maker.
@@ -566,7 +639,6 @@ TEST(XMLTreeIndexes, OneThatIsEndedLeavesNothingBehind) {
 TEST(XMLTreeIndexes, AreNotMadeWhereTheyWouldTakeMuchOfWhatIsLeft) {
   const auto document = parsed(Records(10).text(4000));
   const NSXMLNode* root = document->rootElement();
-  static_cast<void>(indexed(name("a").get(), root));
   {
     const Ceiling ceiling(100'000);
     const int64_t before = workMeter.valueBytes;
@@ -624,6 +696,13 @@ TEST(XMLTreeIndexesThreads, AskOneDocumentAtOnce) {
         if (const auto found = indexed(a, root)) {
           EXPECT_EQ(*found, expected);
           ++answers;
+        }
+        if (turn == 3) NSXMLNoteWalked(wholeWalk, document.get());
+        const NSXMLIndexedWays known = NSXMLIndexedWays::of(document.get());
+        const NSXMLWayStep anywhere{true, a, nullptr};
+        if (known.elements) {
+          const auto count = known.elements->countAlong({&anywhere, 1});
+          EXPECT_EQ(count.value_or(expected.size()), expected.size());
         }
         const NSXMLIndexesRef indexes = NSXMLTreeIndexes::of(root);
         if (const auto* values = indexes->values(key, wholeWalk)) {
