@@ -352,7 +352,7 @@ void XQueryJoinCondition::addNeeded(const std::vector<Ref<XQueryExpr>>& more) {
   for (XQueryJoinCondition& each : orElse) each.addNeeded(more);
 }
 
-void XQueryJoinCondition::join(XQueryJoinCondition other) {
+void XQueryJoinCondition::add(XQueryJoinCondition other) {
   assigns.add(other.assigns);
   // One that asks for one of several is joined with no other.
   if (!orElse.empty() || !other.orElse.empty()) {
@@ -368,7 +368,6 @@ void XQueryJoinCondition::join(XQueryJoinCondition other) {
   }
   isWhole = isWhole && other.isWhole;
   std::move(other.terms.begin(), other.terms.end(), std::back_inserter(terms));
-  putBestFirst();
 }
 
 }  // namespace xquery

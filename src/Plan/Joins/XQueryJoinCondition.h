@@ -82,7 +82,12 @@ struct XQueryJoinCondition {
   std::vector<XQueryJoinCondition> orElse;
 
   // Another condition holds as well, and an error in either excludes an item.
-  void join(XQueryJoinCondition other);
+  void join(XQueryJoinCondition other) {
+    add(std::move(other));
+    putBestFirst();
+  }
+  // The same for one of many, before the best are put first.
+  void add(XQueryJoinCondition other);
   // There is more to the condition.
   void leaveOpen();
   // What is evaluated for no item that is left out must not fail either.

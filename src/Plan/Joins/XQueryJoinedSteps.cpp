@@ -36,6 +36,28 @@ std::vector<XQueryPlaceID> XQueryPredicatesOf(const XQueryPlanning& planning, XQ
   return XQueryPredicatesOf(planning, path, *step.step, step.predicatesInTest);
 }
 
+void XQueryPredicatesOfSteps::findAll() {
+  _areFound = true;
+  WorkPacer pacer;
+  for (XQueryPlaceID part = _planning.program.firstPart(_path); part != XQueryNoPlace;
+       part = _planning.program.nextPart(part)) {
+    pacer.turn();
+    const XQueryPlace& at = _planning.program[part];
+    if (at.step && at.role == XQueryRole::Predicate) _places[at.step].push_back(part);
+  }
+}
+
+std::vector<XQueryPlaceID> XQueryPredicatesOfSteps::of(const XQueryWalkedStep& step) {
+  const size_t count = step.step->predicates().size();
+  if (count == 0) return {};
+  if (!_areFound) findAll();
+  const auto found = _places.find(step.step);
+  if (found == _places.end() || found->second.size() < count) return {};
+  const auto first = found->second.begin();
+  return {first + static_cast<std::ptrdiff_t>(step.predicatesInTest),
+          first + static_cast<std::ptrdiff_t>(count)};
+}
+
 bool XQueryPredicatesAreOfTruth(const XQueryPlanning& planning,
                                 const std::vector<XQueryPlaceID>& places) {
   if (places.empty()) return false;
@@ -51,10 +73,11 @@ bool XQueryPredicatesAreOfTruth(const XQueryPlanning& planning,
 XQueryFacts XQueryFactsUpTo(const XQueryPlanning& planning, XQueryPlaceID place,
                             const XQueryWalkedPath& path, const XQueryWalkedStep& end) {
   XQueryFacts facts;
+  XQueryPredicatesOfSteps predicates(planning, place);
   for (const XQueryWalkedStep& step : path.steps()) {
     if (!staysInside(step.axis)) facts.deeds |= XQueryDeeds::ReadsOutside;
     if (&step == &end) break;
-    const auto places = XQueryPredicatesOf(planning, place, step);
+    const auto places = predicates.of(step);
     if (places.empty() && step.hasPredicates()) facts.deeds |= XQueryDeeds::IsUnrepeatable;
     for (const XQueryPlaceID each : places) facts.addDeedsWithin(planning.facts[each]);
   }

@@ -4,6 +4,7 @@
 #include "Plan/Planning.h"
 
 #include <cstddef>
+#include <unordered_map>
 #include <vector>
 
 namespace xquery {
@@ -19,6 +20,23 @@ std::vector<XQueryPlaceID> XQueryPredicatesOf(const XQueryPlanning& planning, XQ
 // The same without those that its test asks for already.
 std::vector<XQueryPlaceID> XQueryPredicatesOf(const XQueryPlanning& planning, XQueryPlaceID path,
                                               const XQueryWalkedStep& step);
+// The same for many steps of one path, whose parts are looked at once.
+class XQueryPredicatesOfSteps {
+ public:
+  XQueryPredicatesOfSteps(const XQueryPlanning& planning, XQueryPlaceID path)
+      : _planning(planning), _path(path) {}
+
+  std::vector<XQueryPlaceID> of(const XQueryWalkedStep& step);
+
+ private:
+  void findAll();
+
+  const XQueryPlanning& _planning;
+  const XQueryPlaceID _path;
+  bool _areFound = false;
+  std::unordered_map<const XQueryStep*, std::vector<XQueryPlaceID>> _places;
+};
+
 // Whether they, of which there are some, can be asked in any order, of each item by itself.
 bool XQueryPredicatesAreOfTruth(const XQueryPlanning& planning,
                                 const std::vector<XQueryPlaceID>& places);

@@ -41,10 +41,10 @@ XQueryJoinCondition conditionOf(const XQueryPlanning& planning,
   XQueryJoinCondition condition;
   condition.isWhole = true;
   for (const XQueryPlaceID place : places) {
-    condition.join(search.conditionIn(place, true));
-    constexpr size_t termsPerStep = 64;  // they are put in order each time
-    checkWork(1 + condition.terms.size() / termsPerStep);
+    checkWork();
+    condition.add(search.conditionIn(place, true));
   }
+  condition.putBestFirst();
   return condition;
 }
 
@@ -109,11 +109,12 @@ void joinPath(XQueryPlanning& planning, XQueryPlaceID place, XQueryWalkedPath& p
   }
   if (joinSiblings(planning, place, path) || keepSiblings(planning, place, path)) return;
   const auto& steps = path.steps();
+  XQueryPredicatesOfSteps predicates(planning, place);
   for (size_t i = 0; i < steps.size(); ++i) {
     if (steps[i].isExpression() || steps[i].testMayRaise) return;
     // What asks for nothing but names above is asked of a whole way at once.
     if (steps[i].asksForWays) continue;
-    auto condition = conditionOf(planning, XQueryPredicatesOf(planning, place, steps[i]));
+    auto condition = conditionOf(planning, predicates.of(steps[i]));
     if (condition.terms.empty()) continue;
     if (i + 1 < steps.size() && steps[i + 1].isExpression()) return;
     const XQueryFacts facts = XQueryFactsUpTo(planning, place, path, steps[i]);

@@ -38,6 +38,7 @@
 #include <iterator>
 #include <set>
 #include <string_view>
+#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -333,24 +334,38 @@ class Search {
       return isRead ? Loop::Changes : Loop::None;
     }
     if (kind != Kind::FLWORExpr && kind != Kind::QuantifiedExpr) return Loop::None;
-    bool isLoop = false;
-    bool isRead = false;  // what was set since the last loop began
-    for (XQueryPlaceID each = _program.firstPart(whole); each != part;
+    const Clauses& before = clausesBefore(part, whole);
+    if (before.sets.meets(reads)) return Loop::Changes;
+    return before.areInLoop ? Loop::Found : Loop::None;
+  }
+
+  // What stands in a FLWOR or quantified expression before one of its parts: whether a loop begins
+  // there, and what is set from the innermost one on.
+  struct Clauses {
+    bool areInLoop = false;
+    XQueryVariableSet sets;
+  };
+
+  // All parts of the whole are looked at once.
+  const Clauses& clausesBefore(XQueryPlaceID part, XQueryPlaceID whole) const {
+    const auto known = _clausesBefore.find(part);
+    if (known != _clausesBefore.end()) return known->second;
+    Clauses before;
+    for (XQueryPlaceID each = _program.firstPart(whole); each != XQueryNoPlace;
          each = _program.nextPart(each)) {
+      _clausesBefore.emplace(each, before);
       const auto* clause = dyn_cast<XQueryBindingExpr>(at(each).expr);
       if (!clause) continue;
-      // Of several loops, one in the other, the innermost.
-      const bool begins = clause->kind() != Kind::LetExpr;
-      if (begins) isLoop = true;
-      isRead = (isRead && !begins) || variablesOf(*clause).meets(reads);
+      if (clause->kind() != Kind::LetExpr) before = {true, {}};
+      before.sets.add(variablesOf(*clause));
     }
-    if (isRead) return Loop::Changes;
-    return isLoop ? Loop::Found : Loop::None;
+    return _clausesBefore.at(part);
   }
 
   XQueryPlanning& _planning;
   const XQueryProgram& _program;
   std::vector<Work> _work;
+  mutable std::unordered_map<XQueryPlaceID, Clauses> _clausesBefore;
   std::set<std::pair<const XQueryFunctionDecl*, int64_t>> _lists;  // parameters, by their IDs
 };
 

@@ -56,9 +56,10 @@ class Search {
   void takePath(XQueryPlaceID place) {
     XQueryWalkedPath* path = XQueryWalkedPathAt(_planning, place);
     if (!path) return;
+    XQueryPredicatesOfSteps predicates(_planning, place);
     for (XQueryWalkedStep& step : path->changeableSteps()) {
       if (!step.filtersEach) continue;
-      for (const XQueryPlaceID predicate : XQueryPredicatesOf(_planning, place, step)) {
+      for (const XQueryPlaceID predicate : predicates.of(step)) {
         if (!takeCondition(predicate, {}, *path, step)) continue;
         _planning.choose(place);
         break;

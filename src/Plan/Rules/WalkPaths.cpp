@@ -10,7 +10,7 @@
 #include "Plan/Rules.h"
 #include "Plan/Rules/PathAt.h"
 
-#include <algorithm>
+#include <functional>
 
 namespace xquery {
 
@@ -23,10 +23,12 @@ XQueryWalkedPath* XQueryWalkedPathAt(const XQueryPlanning& planning, XQueryPlace
 
 std::optional<size_t> XQueryPredicateAt(const XQueryPlace& place) {
   const auto& predicates = place.step->predicates();
-  const auto found = std::find_if(predicates.begin(), predicates.end(),
-                                  [&](const auto& each) { return &each == place.slot; });
-  if (found == predicates.end()) return std::nullopt;
-  return static_cast<size_t>(found - predicates.begin());
+  const auto* const first = predicates.data();
+  const std::less<> isBefore;
+  if (isBefore(place.slot, first) || !isBefore(place.slot, first + predicates.size())) {
+    return std::nullopt;
+  }
+  return static_cast<size_t>(place.slot - first);
 }
 
 void XQueryWalkPaths(XQueryPlanning& planning) {
