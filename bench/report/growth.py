@@ -7,7 +7,7 @@ from typing import Any
 import page
 from bench import Bench
 from engines import Ours, peers
-from queries import hot
+from queries import REPEATS, hot
 
 TITLE = "Growth"
 SIZES = (1, 3, 10, 30, 100, 300)
@@ -27,7 +27,7 @@ def measure(bench: Bench) -> dict[str, Any]:
                 # What could not be had of a smaller document is not asked of a larger one.
                 given_up = bool(times) and times[-1] is None
                 times.append(None if given_up else hot(
-                    engine, bench.document("auction", size), query, 10 if size < 100 else 3))
+                    engine, bench.document("auction", size), query, REPEATS))
         figures[query.name.split(".")[0]] = sides
     return figures
 
