@@ -20,6 +20,8 @@ class XQueryScalarBody : public XQueryPlannedExpr {
   struct Program {
     XQueryScalarProgram scalars;
     std::vector<Ref<XQueryLiteral>> literals;
+    // What constants refer to: other rules may drop the expressions that hold it.
+    std::vector<Value> constants;
   };
 
   // `parameters`: the IDs of their variables.

@@ -64,6 +64,8 @@ class XQueryScalarSteps {
     _operands.insert(_operands.end(), operands.begin(), operands.end());
     return static_cast<Index>(_operands.size() - operands.size());
   }
+  // What a constant refers to: other rules may drop the expression that holds it.
+  void hold(Value constant) { _constants.push_back(std::move(constant)); }
   size_t count() const { return _steps.size(); }
   const Step& operator[](size_t index) const { return _steps[index]; }
 
@@ -85,6 +87,7 @@ class XQueryScalarSteps {
 
   std::vector<Step> _steps;
   std::vector<Index> _operands;
+  std::vector<Value> _constants;
 };
 
 class XQueryScalarExpr : public XQueryPlannedExpr,

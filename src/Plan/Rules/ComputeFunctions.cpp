@@ -130,24 +130,29 @@ class Compiler {
 
   // Of one that may be the answer the object matters.
   Added addLiteral(XQueryLiteral& literal, Use use) {
-    const NSObject* value = literal.literalValue().get();
+    NSObject* value = literal.literalValue().get();
     if (isa<NSNull>(value)) return addConstant(XQueryScalar::ofNothing());
     if (isa<NSString>(value)) {
       if (use == Use::Answer) _into.literals.emplace_back(&literal);
-      return addConstant(XQueryScalar::ofObject(value));
+      return addObject(value);
     }
     const auto number = XQueryNumericOperand::of(value, false);
     const bool isInteger = number.form == XQueryNumericOperand::Exact && number.isInteger &&
                            number.exact->isSmallInteger();
     if (number.form == XQueryNumericOperand::Other) return {};
     const bool isLong = !isInteger && number.form == XQueryNumericOperand::Exact;
-    if (isLong && use == Use::Operand) return addConstant(XQueryScalar::ofObject(value));
+    if (isLong && use == Use::Operand) return addObject(value);
     if (use == Use::Answer) {
       _into.literals.emplace_back(&literal);
-      return addConstant(XQueryScalar::ofObject(value));
+      return addObject(value);
     }
     return addConstant(isInteger ? XQueryScalar::ofInteger(number.exact->smallInteger())
                                  : XQueryScalar::ofDouble(number.number));
+  }
+
+  Added addObject(NSObject* value) {
+    _into.constants.emplace_back(value);
+    return addConstant(XQueryScalar::ofObject(value));
   }
 
   Added addConstant(const XQueryScalar& constant) {

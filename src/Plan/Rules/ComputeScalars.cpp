@@ -71,6 +71,7 @@ class Compiler {
     if (use == Use::Argument) {
       // A function may answer an argument, and which object that is can be told.
       step.constant = XQueryScalar::ofObject(literal.literalValue().get());
+      _steps.hold(literal.literalValue());
       return _steps.add(step);
     }
     const auto number = XQueryNumericOperand::of(literal.literalValue().get(), false);
@@ -81,6 +82,7 @@ class Compiler {
       step.constant = XQueryScalar::ofInteger(number.exact->smallInteger());
     } else if (number.form == XQueryNumericOperand::Exact) {
       step.constant = XQueryScalar::ofObject(literal.literalValue().get());
+      _steps.hold(literal.literalValue());
     } else {
       return std::nullopt;
     }
